@@ -15,8 +15,13 @@ public:
     [[nodiscard]] int Code() const { return code_; }               // OCI_SUCCESS, OCI_ERROR, OCI_NO_DATA, ...
     [[nodiscard]] int Number() const { return number_; }           // published error number; 0: no record
     [[nodiscard]] const std::string& Detail() const { return detail_; }
+    [[nodiscard]] const char* Engine() const { return engine_; }   // who says it, in the record's text
+
+    // The same status as said by an engine: a literal like "SQLITE".
+    Status&& From(const char* engine) && { engine_ = engine; return std::move(*this); }
 
 private:
+    const char* engine_ = "CLIENT";
     int code_ = 0;
     int number_ = 0;
     std::string detail_;

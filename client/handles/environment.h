@@ -1,0 +1,93 @@
+// Environments: mode, memory, and the texts between the application's form and UTF-8. An environment owns every object
+// made in it; freeing it frees them all.
+#pragma once
+
+#include <atomic>
+#include <cstddef>
+#include <cstdint>
+#include <mutex>
+#include <string>
+#include <string_view>
+
+#include "handles/error_handle.h"
+#include "handles/object.h"
+#include "handles/status.h"
+
+// The application's memory functions; all null: the library's own.
+struct MemoryFunctions {
+    void* context = nullptr;
+    void* (*allocate)(void* context, std::size_t size) = nullptr;
+    void (*release)(void* context, void* memory) = nullptr;
+};
+
+class Environment : public Object {
+public:
+    static constexpr Kind kKind = Kind::environment;
+
+    // Null when memory fails. The environment lies in memory of the functions given.
+    static Environment* Open(std::uint32_t mode, const MemoryFunctions& memory, std::size_t extra) noexcept;
+
+    [[nodiscard]] std::uint32_t Mode() const { return mode_; }
+    [[nodiscard]] bool Utf16() const { return utf16_; }
+    [[nodiscard]] bool Threaded() const { return threaded_; }
+    [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+
+    // Memory that lives at most as long as the environment: 16-byte aligned, counted. Throws std::bad_alloc.
+    void* Allocate(std::size_t size);
+    void Release(void* memory) noexcept;    // null is harmless
+
+    ErrorList errors;    // of calls without an error handle
+
+private:
+    friend class ObjectTree;
+    Environment(const Origin& origin, std::uint32_t mode, const MemoryFunctions& memory);
+
+    void Close() noexcept;    // the end of its own memory
+
+    std::uint32_t mode_;
+    bool utf16_;
+    bool threaded_;
+    MemoryFunctions memory_;
+    std::mutex tree_mutex_;    // links between this environment's objects
+};
+
+// Blocks the library holds in all environments.
+std::int64_t HeldBlocks() noexcept;
+
+// What OCIInitialize recorded for OCIEnvInit.
+struct ProcessDefaults {
+    std::uint32_t mode = 0;
+    MemoryFunctions memory;
+};
+void SetProcessDefaults(const ProcessDefaults& defaults);
+ProcessDefaults GetProcessDefaults();
+
+// A text of the application's as UTF-8. Bytes are borrowed, not copied; UTF-16 is converted. `length` counts bytes.
+// Malformed UTF-16 (an odd length, half a pair) makes Valid false: error 24501.
+class TextIn {
+public:
+    TextIn(const Environment& environment, const void* text, std::size_t length);
+    [[nodiscard]] std::string_view View() const { return view_; }
+    [[nodiscard]] bool Valid() const { return valid_; }
+
+private:
+    std::string converted_;
+    std::string_view view_;
+    bool valid_ = true;
+};
+
+// UTF-8 to a form that the application reads: itself, or UTF-16 in `converted`. The view is bytes.
+std::string_view TextOut(const Environment& environment, std::string_view utf8, std::string& converted);
+
+// Puts a text into the application's buffer, cut to whole characters and closed with a zero (two in UTF-16). False when
+// it was cut; nothing is written into a buffer that has no room for the zero.
+bool TextToBuffer(const Environment& environment, std::string_view utf8, void* buffer, std::size_t size);
+
+// The bytes of a zero-terminated text of the application's.
+std::size_t TextLength(const Environment& environment, const void* text);
+
+namespace utf {
+// Between UTF-8 and UTF-16 in native order. False: malformed input; what came before it is in `out`.
+bool ToUtf8(const void* utf16, std::size_t bytes, std::string& out);
+bool ToUtf16(std::string_view utf8, std::string& out);    // bytes of the units
+}  // namespace utf

@@ -1,0 +1,53 @@
+// Error records: number, SQLSTATE and text of what a call had to say. They hang on an error handle or an environment.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "handles/object.h"
+#include "handles/status.h"
+
+// The short published wording of a number, without its prefix; a general one for numbers that have none.
+std::string_view ErrorText(int number) noexcept;
+// The five characters of its SQLSTATE.
+std::string_view SqlState(int number) noexcept;
+// "[KELP/<ENGINE>] ORA-nnnnn: <text>", then the engine's own words in the next line where it had some, and a line feed.
+std::string ErrorMessage(int number, std::string_view engine, std::string_view detail);
+
+// The records of the last call. Recording formats nothing: texts are put together when they are asked for.
+class ErrorList {
+public:
+    struct Record {
+        int number;
+        const char* engine;
+        std::string detail;
+    };
+
+    void Clear() noexcept { records_.clear(); }
+    void Add(const Status& status);    // nothing for a status without a number; throws std::bad_alloc
+    [[nodiscard]] const std::vector<Record>& Records() const { return records_; }
+
+private:
+    std::vector<Record> records_;
+};
+
+class ErrorHandle : public Object {
+public:
+    static constexpr Kind kKind = Kind::error;
+
+    // A row that failed in batch-error mode.
+    struct RowFailure {
+        std::uint32_t row;    // from 0
+        Status status;
+    };
+
+    explicit ErrorHandle(const Origin& origin) : Object(origin) {}
+    [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+
+    ErrorList list;
+    // Set by an execute and kept until the next one through this handle, not emptied by other calls.
+    std::vector<RowFailure> row_failures;
+    std::uint32_t row_offset = 0;    // OCI_ATTR_DML_ROW_OFFSET
+};

@@ -1,0 +1,88 @@
+// The gate that every exported function passes: checks the error handle and the object (null, foreign and freed pointers
+// get OCI_INVALID_HANDLE and no record), empties the records, runs the body, turns what it answers or throws into a
+// record and the return code. Bodies answer a Status and may throw.
+//
+//   sword OCIPing(OCISvcCtx* svchp, OCIError* errhp, ub4) {
+//       return Enter<ServiceContext>(svchp, errhp, [](ServiceContext& service) { return service.Ping(); });
+//   }
+#pragma once
+
+#include <exception>
+#include <mutex>
+#include <new>
+
+#include "handles/environment.h"
+#include "handles/error_handle.h"
+#include "oci.h"
+
+constexpr int kOutOfMemory = 1019;
+constexpr int kInternalError = 600;
+constexpr int kNullArgument = 21560;    // an argument is null or out of range
+
+// Adds the record of a status and answers its return code.
+sword Record(ErrorList& list, const Status& status) noexcept;
+
+// Held while a call on an object runs; nothing in environments without threads.
+class SerialLock {
+public:
+    explicit SerialLock(std::recursive_mutex* mutex) : mutex_(mutex) { if (mutex_) mutex_->lock(); }
+    ~SerialLock() { if (mutex_) mutex_->unlock(); }
+    SerialLock(const SerialLock&) = delete;
+    SerialLock& operator=(const SerialLock&) = delete;
+
+private:
+    std::recursive_mutex* mutex_;
+};
+
+// Runs a body and records into `list`.
+template <class Body>
+sword Guard(ErrorList& list, Body&& body) noexcept {
+    try {
+        const Status status = body();
+        return status.Ok() ? OCI_SUCCESS : Record(list, status);
+    } catch (const std::bad_alloc&) {
+        return Record(list, Error(kOutOfMemory));
+    } catch (const std::exception& failure) {
+        return Record(list, Error(kInternalError, failure.what()));
+    } catch (...) {
+        return Record(list, Error(kInternalError));
+    }
+}
+
+// Calls that have an object and an error handle: body(T&).
+template <class T, class Body>
+sword Enter(const void* object, OCIError* errhp, Body&& body) noexcept {
+    ErrorHandle* error = Live<ErrorHandle>(errhp);
+    if (!error) return OCI_INVALID_HANDLE;
+    error->list.Clear();
+    T* target = Live<T>(object);
+    if (!target) return OCI_INVALID_HANDLE;
+    const SerialLock lock(target->Serial());
+    return Guard(error->list, [&] { return body(*target); });
+}
+
+// The same for bodies that need the error handle too: body(T&, ErrorHandle&).
+template <class T, class Body>
+sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept {
+    return Enter<T>(object, errhp, [&](T& target) { return body(target, *Live<ErrorHandle>(errhp)); });
+}
+
+// Calls that have nothing but an error handle: body(ErrorHandle&).
+template <class Body>
+sword EnterError(OCIError* errhp, Body&& body) noexcept {
+    ErrorHandle* error = Live<ErrorHandle>(errhp);
+    if (!error) return OCI_INVALID_HANDLE;
+    error->list.Clear();
+    return Guard(error->list, [&] { return body(*error); });
+}
+
+// Calls whose first argument is an environment or a session handle: body(Environment&).
+template <class Body>
+sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
+    ErrorHandle* error = Live<ErrorHandle>(errhp);
+    if (!error) return OCI_INVALID_HANDLE;
+    error->list.Clear();
+    const Kind kind = live::KindOf(handle);
+    if (kind != Kind::environment && kind != Kind::session) return OCI_INVALID_HANDLE;
+    return Guard(error->list, [&] { return body(Live<Object>(handle)->Env()); });
+}

@@ -1,0 +1,60 @@
+// The tree of objects: who hangs below whom, what dies with what.
+#include "handles/object.h"
+
+#include <cstring>
+
+#include "handles/environment.h"
+
+std::string& Object::KeptText(std::uint32_t attribute) {
+    for (auto& [kept, text] : kept_texts_) {
+        if (kept == attribute) return text;
+    }
+    return kept_texts_.emplace_back(attribute, std::string()).second;
+}
+
+void* ObjectTree::Reserve(Environment& environment, std::size_t size) { return environment.Allocate(size); }
+
+void ObjectTree::Unreserve(Environment& environment, void* memory) noexcept { environment.Release(memory); }
+
+void ObjectTree::Adopt(Object& object, Kind kind, std::size_t extra) {
+    Environment& environment = object.Env();
+    void* user_memory = extra > 0 ? environment.Allocate(extra) : nullptr;
+    try {
+        live::Insert(&object, kind);
+    } catch (...) {
+        environment.Release(user_memory);
+        throw;
+    }
+    if (user_memory) std::memset(user_memory, 0, extra);
+    object.user_memory_ = user_memory;
+    if (!object.parent_) return;
+    const std::lock_guard lock(environment.tree_mutex_);
+    object.next_ = object.parent_->first_child_;
+    if (object.next_) object.next_->previous_ = &object;
+    object.parent_->first_child_ = &object;
+}
+
+void ObjectTree::Unlink(Object& object) noexcept {
+    if (!object.parent_) return;
+    const std::lock_guard lock(object.Env().tree_mutex_);
+    if (object.previous_) object.previous_->next_ = object.next_;
+    else object.parent_->first_child_ = object.next_;
+    if (object.next_) object.next_->previous_ = object.previous_;
+    object.previous_ = object.next_ = nullptr;
+}
+
+void ObjectTree::Destroy(Object* object) noexcept {
+    Unlink(*object);
+    DestroyUnlinked(object);
+}
+
+// The youngest child first: what was made later may lean on what was made before.
+void ObjectTree::DestroyUnlinked(Object* object) noexcept {
+    live::Erase(object);
+    while (Object* child = object->first_child_) Destroy(child);
+    Environment& environment = object->Env();
+    environment.Release(object->user_memory_);
+    if (object == static_cast<Object*>(&environment)) return environment.Close();
+    object->~Object();
+    environment.Release(object);
+}
