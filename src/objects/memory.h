@@ -1,0 +1,15 @@
+// Memory of the driver's own: blocks tagged "harnix" with the line that asked for them.
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <source_location>
+
+// A zero-filled block of at least one byte. Failure prints "GetMem: failed to allocate memory.\n" and gives null.
+void* GetMem(size_t size, std::source_location where = std::source_location::current());
+void FreeMem(void* block);
+
+struct FreeMemory {
+    void operator()(void* block) const { FreeMem(block); }
+};
+template <class T> using Memory = std::unique_ptr<T, FreeMemory>;

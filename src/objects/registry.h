@@ -1,0 +1,121 @@
+// Named objects: for each kind a fixed table from the name a script gives to the pointer the library returned.
+// Tables are searched from slot 0, so the lowest free slot is filled first. Names are cut to the slot's width before they
+// are stored or compared, and are unique within a kind only. Used by the command thread only; nothing here locks.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <optional>
+#include <span>
+
+enum class Kind : uint8_t {
+    environment, error, svc, server, session, trans, spool, cpool, stmt, describe, bind, define, param,
+    lob, result, rowid, file, datetime,  // descriptors: may be arrays, names may carry an index
+    string, raw, mutex, key, tid, thnd,
+    buffer, memory_struct, cursor, ldainfo  // records of their own, in tables of their own
+};
+
+struct KindInfo {
+    int capacity;
+    int name_width;        // of the slot's name field, the closing zero included
+    const char* overflow;  // printed with the capacity when the table is full
+    const char* in_use;    // printed when a new name is taken; null where taking is never checked
+};
+const KindInfo& InfoOf(Kind kind);
+
+struct NamedObject {
+    bool in_use;            // release clears this and nothing else
+    uint8_t name_width;
+    uint16_t lob_type;      // lob: the external type, such as 112
+    uint32_t lob_flag;      // lob
+    uint32_t array_count;   // descriptors: elements of the array, 0 for a single descriptor
+    uint32_t utf16_mode;    // stmt: 0x4000 when the statement's character data is UTF-16
+    void* parent;           // the environment it was made from
+    void* object;           // the library's pointer; of an array of descriptors, the array
+    void* owner;            // bind, define: the statement
+    char* pool_name;        // spool, cpool: filled by the library
+    uint32_t pool_name_length;
+    char name[36];
+    unsigned char* area;    // key: 80 bytes of the slot's own
+};
+
+// A deliberately bad object: a static, writable 15-byte text "Invalid buffer".
+void* InvalidObject();
+
+// --- Looking up -------------------------------------------------------------------------------------------------------
+
+// The pointer an argument stands for: "invalid" the bad object, "null" a null pointer; an unknown name prints
+// "Handle %s not found\n" and gives a null pointer, with which the call is made all the same. Names of descriptors may
+// carry an index.
+void* ResolveObject(Kind kind, const char* name);
+template <class T> T* Resolve(Kind kind, const char* name) {
+    return static_cast<T*>(ResolveObject(kind, name));
+}
+
+// The same for an error handle argument, which any kind may supply: the error table is searched first.
+void* ResolveErrorObject(const char* name);
+template <class T> T* ResolveError(const char* name) {
+    return static_cast<T*>(ResolveErrorObject(name));
+}
+
+// A descriptor argument with all that its name says. `slot` is null unless the name was found.
+struct DescriptorReference {
+    void* object = nullptr;
+    NamedObject* slot = nullptr;
+    bool is_array = false;  // `object` is the whole array
+    long index = 0;         // as given in the name
+};
+DescriptorReference ResolveDescriptor(Kind kind, const char* name);
+
+// The first occupied slot of that name, or null. Prints nothing and knows no reserved words.
+NamedObject* FindByName(Kind kind, const char* name);
+// The first occupied slot of that pointer, or null.
+NamedObject* FindByPointer(Kind kind, const void* object);
+
+// --- Making and freeing -----------------------------------------------------------------------------------------------
+
+// Null for "-1" and "null": the library gets a null output location and nothing is registered. Else the word itself.
+const char* OutputName(const char* word);
+
+// Whether the name is taken; prints the kind's message if so.
+bool CheckInUse(Kind kind, const char* name);
+
+// Fills the first free slot after a successful call. "null" and "invalid" print "Variable name NULL not allowed\n", a full
+// table its overflow message; both give null.
+NamedObject* Register(Kind kind, const char* name, void* object, void* parent);
+
+// Frees the first slot of that name after a successful call; "Handle %s not found\n" when there is none.
+void Release(Kind kind, const char* name);
+
+// The table that a numeric handle or descriptor type stands for.
+std::optional<Kind> KindOfHandleType(int type);
+std::optional<Kind> KindOfDescriptorType(int type);
+
+// --- For kinds with records of their own ------------------------------------------------------------------------------
+// A record has at least `in_use` and a character array `name`.
+
+// Whether the slot's name is the word, cut to the slot's width.
+template <class Slot> bool HasName(const Slot& slot, const char* name) {
+    constexpr size_t kWidth = sizeof slot.name;
+    return std::strncmp(slot.name, name, kWidth - 1) == 0;
+}
+template <class Slot> Slot* FindSlot(std::span<Slot> slots, const char* name) {
+    for (Slot& slot : slots)
+        if (slot.in_use && HasName(slot, name)) return &slot;
+    return nullptr;
+}
+// Occupies the first free slot under the name; prints the kind's overflow message when there is none. The slot's other
+// fields are left as they were.
+void ReportOverflow(Kind kind);
+template <class Slot> Slot* OccupySlot(Kind kind, std::span<Slot> slots, const char* name) {
+    for (Slot& slot : slots) {
+        if (slot.in_use) continue;
+        slot.in_use = true;
+        std::memset(slot.name, 0, sizeof slot.name);
+        std::strncpy(slot.name, name, sizeof slot.name - 1);
+        return &slot;
+    }
+    ReportOverflow(kind);
+    return nullptr;
+}

@@ -1,0 +1,52 @@
+// Texts between the application code page and UTF-16.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+// Converts a text argument. Returns 0 (or a tolerated warning of the code-page service), -1 for a bad argument, else the
+// service's code; says so by its messages. Lengths and capacity in bytes. A word W'...' is copied, not converted.
+int convertToUTF16(const char* input, uint32_t input_length, char* output, uint32_t capacity, uint32_t* output_length,
+                   bool quiet = false);
+
+// A UTF-16 text of the library as the application code page shows it. False after a failure, which has been printed.
+bool convertFromUTF16(const void* text, size_t length, std::string& output);
+
+// The bytes of a UTF-16 text before its first zero pair, looking no further than `limit` bytes.
+size_t Utf16Length(const void* text, size_t limit);
+
+// Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". False after a failed
+// conversion, which has been printed after what the line held.
+class Line;
+bool AddText(Line& line, const void* text, size_t length, bool utf16);
+
+// How large the area for the UTF-16 form of an argument is.
+enum class TextArea {
+    four_times,          // of the typed length; a length of 0 is complained about and ends the command
+    four_times_and_one   // one byte more; a length of 0 passes the zeroed area
+};
+
+// A text argument with the length typed for it, ready to be passed: in UTF-16 mode the converted text and its length,
+// else the word and the length as typed. The length may be anything; what is passed can be read up to that length (a
+// word is followed by zeros), unless the length is beyond kReadableText, where only the library can say no.
+class TextArgument {
+public:
+    static constexpr uint32_t kReadableText = 256u << 20;
+
+    // Texts beside "null" that stand for a null pointer are for the caller to say: pass a null word then. False when the
+    // command ends here (no memory, failed conversion): the message has been printed.
+    bool Set(const char* word, long length, TextArea area);
+
+    unsigned char* Text() const { return text_; }
+    uint32_t Length() const { return length_; }
+
+private:
+    bool Convert(const char* word, uint32_t length, TextArea area);
+    unsigned char* text_ = nullptr;
+    uint32_t length_ = 0;
+    std::vector<char> padded_;
+    std::vector<char> converted_;
+};

@@ -1,0 +1,20 @@
+// Texts of a script stored into elements, by external data type.
+#pragma once
+
+#include <cstdint>
+
+// An element to be filled. The pointers may be null where the element has no such field.
+struct ElementTarget {
+    int type;
+    unsigned char* data;
+    uint32_t size;
+    int16_t* indicator;
+    uint16_t* length;
+    uint16_t* return_code;
+    uint16_t precision;  // packed decimal only
+    int16_t scale;
+};
+
+// Stores `length` bytes of the text (never past the end of the element). "null" sets the indicator only. False when the
+// text cannot be read as the type: "Invalid value - %s\n" has been printed and the element is as it was.
+bool AssignText(const ElementTarget& target, const char* text, long length);
