@@ -1,0 +1,33 @@
+// Time zones: offsets like "+05:30" and regions like "Europe/Paris", whose rules are read from the system's zone data.
+// A region is known by a small number that stays the same for the life of the process. Safe from several threads.
+#pragma once
+
+#include <cstdint>
+#include <string_view>
+
+#include "date/date.h"
+
+namespace date {
+
+constexpr Errno kBadZoneHour = 1874;
+constexpr Errno kBadZoneMinute = 1875;
+constexpr Errno kUnknownRegion = 1882;
+
+// Gives `value`, whose date and time are local, the zone that a text names: "+hh:mm", "-hh:mm" or a region. In a region
+// the offset is the one in force at that local time; of an hour that comes twice the first is meant, one that is skipped
+// counts with the offset before it. Empty: the zone of the process.
+Errno SetZone(std::string_view zone, DateTime* value) noexcept;
+
+// The name of a value's region; empty without one.
+std::string_view RegionName(const DateTime& value) noexcept;
+// The short name in force in its region ("CEST"); empty without one. The view lives as long as the process.
+std::string_view ZoneAbbreviation(const DateTime& value) noexcept;
+
+// -1, 0, 1 by the moment that is meant; a value without a zone counts as one in the zone of the process.
+int CompareMoments(const DateTime& left, const DateTime& right) noexcept;
+
+// The same moment seen at an offset, or in the zone of the process.
+Errno ToOffset(const DateTime& value, int zone_minutes, DateTime* result) noexcept;
+Errno ToLocal(const DateTime& value, DateTime* result) noexcept;
+
+}  // namespace date
