@@ -3,6 +3,7 @@
 
 #include <cstdlib>
 
+#include "handles/attributes.h"
 #include "oci.h"
 
 namespace {
@@ -31,7 +32,44 @@ void ReleaseTo(const MemoryFunctions& memory, void* aligned) noexcept {
 std::mutex defaults_mutex;
 ProcessDefaults process_defaults;
 
+constexpr std::uint16_t kCharacterSetUtf8 = 873;
+
+Status InObjectMode(Environment& environment, AttributeValue& value) {
+    value.integer = environment.Mode() & OCI_OBJECT ? 1 : 0;
+    return {};
+}
+
+Status CharacterSet(Environment& environment, AttributeValue& value) {
+    value.integer = environment.Utf16() ? OCI_UTF16ID : kCharacterSetUtf8;
+    return {};
+}
+
+Status InUtf16(Environment& environment, AttributeValue& value) {
+    value.integer = environment.Utf16() ? 1 : 0;
+    return {};
+}
+
+// All memory of all environments comes from one heap, whose size nobody keeps.
+Status NoHeap(Environment&, AttributeValue&) { return {}; }
+
+using E = Environment;
+constexpr AttributeRow kRows[] = {
+    {OCI_ATTR_OBJECT, Shape::ub4, Get<E, InObjectMode>, nullptr},
+    {OCI_ATTR_HEAPALLOC, Shape::ub4, Get<E, NoHeap>, nullptr},
+    {OCI_ATTR_SHARED_HEAPALLOC, Shape::ub4, Get<E, NoHeap>, nullptr},
+    {OCI_ATTR_CHARSET_ID, Shape::ub2, Get<E, CharacterSet>, nullptr},
+    {OCI_ATTR_NCHARSET_ID, Shape::ub2, Get<E, CharacterSet>, nullptr},
+    {OCI_ATTR_ENV_UTF16, Shape::ub1, Get<E, InUtf16>, nullptr},
+    {OCI_ATTR_CACHE_OPT_SIZE, Shape::ub4, GetField<&E::cache_optimal_size>, SetField<&E::cache_optimal_size>},
+    {OCI_ATTR_CACHE_MAX_SIZE, Shape::ub4, GetField<&E::cache_maximal_excess>, SetField<&E::cache_maximal_excess>},
+    {OCI_ATTR_PINOPTION, Shape::ub2, GetField<&E::pin_option>, SetField<&E::pin_option>},
+    {OCI_ATTR_ALLOC_DURATION, Shape::ub2, GetField<&E::allocation_duration>, SetField<&E::allocation_duration>},
+    {OCI_ATTR_PIN_DURATION, Shape::ub2, GetField<&E::pin_duration>, SetField<&E::pin_duration>},
+};
+
 }  // namespace
+
+std::span<const AttributeRow> Environment::Attributes() const { return kRows; }
 
 std::int64_t HeldBlocks() noexcept { return held_blocks.load(std::memory_order_relaxed); }
 

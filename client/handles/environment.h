@@ -38,6 +38,13 @@ public:
 
     ErrorList errors;    // of calls without an error handle
 
+    // Kept for the application, without effect here.
+    std::uint32_t cache_optimal_size = 8388608;
+    std::uint32_t cache_maximal_excess = 10;    // per cent
+    std::uint16_t pin_option = 1;
+    std::uint16_t allocation_duration = 10;
+    std::uint16_t pin_duration = 10;
+
 private:
     friend class ObjectTree;
     Environment(const Origin& origin, std::uint32_t mode, const MemoryFunctions& memory);

@@ -13,7 +13,7 @@
 std::string_view ErrorText(int number) noexcept;
 // The five characters of its SQLSTATE.
 std::string_view SqlState(int number) noexcept;
-// "[KELP/<ENGINE>] ORA-nnnnn: <text>", then the engine's own words in the next line where it had some, and a line feed.
+// "[KELP/<ENGINE>] ORA-nnnnn: <text>", then ": " and the engine's own words where it had some, and a line feed.
 std::string ErrorMessage(int number, std::string_view engine, std::string_view detail);
 
 // The records of the last call. Recording formats nothing: texts are put together when they are asked for.

@@ -8,8 +8,10 @@
 #pragma once
 
 #include <exception>
+#include <memory>
 #include <mutex>
 #include <new>
+#include <utility>
 
 #include "handles/environment.h"
 #include "handles/error_handle.h"
@@ -22,16 +24,18 @@ constexpr int kNullArgument = 21560;    // an argument is null or out of range
 // Adds the record of a status and answers its return code.
 sword Record(ErrorList& list, const Status& status) noexcept;
 
-// Held while a call on an object runs; nothing in environments without threads.
+// Held while a call on an object runs, which may destroy the object; nothing in environments without threads.
 class SerialLock {
 public:
-    explicit SerialLock(std::recursive_mutex* mutex) : mutex_(mutex) { if (mutex_) mutex_->lock(); }
+    explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) : mutex_(std::move(mutex)) {
+        if (mutex_) mutex_->lock();
+    }
     ~SerialLock() { if (mutex_) mutex_->unlock(); }
     SerialLock(const SerialLock&) = delete;
     SerialLock& operator=(const SerialLock&) = delete;
 
 private:
-    std::recursive_mutex* mutex_;
+    std::shared_ptr<std::recursive_mutex> mutex_;
 };
 
 // Runs a body and records into `list`.

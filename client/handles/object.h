@@ -7,6 +7,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <mutex>
 #include <new>
 #include <span>
@@ -53,7 +54,7 @@ public:
     [[nodiscard]] virtual std::span<const AttributeRow> Attributes() const { return {}; }
 
     // What calls on this object hold while they run: one mutex a connection in a threaded environment, else null.
-    [[nodiscard]] virtual std::recursive_mutex* Serial() { return nullptr; }
+    [[nodiscard]] virtual std::shared_ptr<std::recursive_mutex> Serial() { return nullptr; }
 
     // Keeps a converted attribute text for as long as the object lives or until the same attribute is kept anew.
     std::string& KeptText(std::uint32_t attribute);

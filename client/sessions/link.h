@@ -1,0 +1,71 @@
+// A link: one user session's connection to its engine. Service contexts and statements share it; when the session ends
+// the link closes, everything made from the connection is dropped first, and who still holds the link finds it closed.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <mutex>
+#include <string>
+
+#include "engine/engine.h"
+
+class Link;
+
+// Somebody who holds queries or other things of the connection: told before it goes.
+class LinkUser {
+public:
+    // Drop what was made from the connection, and the link itself. May not throw.
+    virtual void LinkClosed() noexcept = 0;
+
+protected:
+    LinkUser() = default;
+    virtual ~LinkUser();
+    LinkUser(const LinkUser&) = delete;
+    LinkUser& operator=(const LinkUser&) = delete;
+
+    // Joins a link, leaving the one before; null only leaves.
+    void Use(std::shared_ptr<Link> link) noexcept;
+    [[nodiscard]] const std::shared_ptr<Link>& UsedLink() const { return link_; }
+
+private:
+    friend class Link;
+    std::shared_ptr<Link> link_;
+    LinkUser* previous_ = nullptr;
+    LinkUser* next_ = nullptr;
+};
+
+// Something a room above keeps with a session, such as the statement cache.
+struct LinkData {
+    virtual ~LinkData() = default;
+};
+
+class Link {
+public:
+    // `threaded`: calls on the link are serialised.
+    Link(std::unique_ptr<engine::Connection> connection, bool threaded);
+    ~Link();
+    Link(const Link&) = delete;
+    Link& operator=(const Link&) = delete;
+
+    [[nodiscard]] bool Closed() const { return !connection_; }
+    [[nodiscard]] engine::Connection& Engine() { return *connection_; }    // not when closed
+    [[nodiscard]] const std::shared_ptr<std::recursive_mutex>& Serial() const { return serial_; }
+
+    // Stops the call that runs on the connection. From any thread.
+    void Cancel() noexcept;
+
+    // Commits or rolls back, drops what depends on the connection and gives the connection up.
+    Status Finish(bool commit);
+    std::unique_ptr<engine::Connection> Close() noexcept;    // the connection, rolled back; null when closed before
+
+    std::unique_ptr<LinkData> statement_cache;
+    std::string user;                    // who is logged on; empty: the operating-system user
+    std::uint32_t open_statements = 0;    // OCI_ATTR_NUM_OPEN_STMTS
+
+private:
+    friend class LinkUser;
+    std::unique_ptr<engine::Connection> connection_;
+    std::shared_ptr<std::recursive_mutex> serial_;
+    std::mutex cancel_mutex_;    // between Cancel and the end of the connection
+    LinkUser* first_user_ = nullptr;
+};
