@@ -78,6 +78,8 @@ struct Dialect {
     std::span<const Spelling> types;         // replaced as whole words in definition statements and casts
     std::span<const Spelling> functions;     // replaced as whole words in expressions
     bool has_dual = false;                   // whether "from dual" is understood as it stands
+    bool has_for_update = false;             // whether "for update" is; cut off where it is not
+    bool has_date_literals = false;          // whether date '...' and timestamp '...' are; plain texts where not
 };
 
 struct Credentials {

@@ -1,0 +1,227 @@
+#include "sql/engine_text.h"
+
+#include <algorithm>
+#include <array>
+#include <span>
+
+#include "date/date.h"
+#include "sql/token_list.h"
+
+namespace sql {
+namespace {
+
+using Spellings = std::span<const engine::Dialect::Spelling>;
+
+// The application's q'[text]' as a plain literal.
+std::string PlainLiteral(std::string_view q_literal) {
+    const std::size_t quote = q_literal.find('\'');
+    std::string literal = "'";
+    for (const char c : q_literal.substr(quote + 2, q_literal.size() - quote - 4)) literal.append(c == '\'' ? 2 : 1, c);
+    return literal += '\'';
+}
+
+class Rewriter {
+public:
+    Rewriter(std::string_view text, const StatementText& statement, const Step& step, const engine::Dialect& dialect)
+        : text_(text), statement_(statement), step_(step), dialect_(dialect),
+          tokens_(Tokenize(text, step.begin, step.end)),
+          names_columns_(statement.type == StatementType::create || statement.type == StatementType::alter),
+          defines_code_(DefinesCode(tokens_)) {
+        result_.source_begin = copied_ = step.begin;
+    }
+
+    EngineText Result() {
+        for (std::size_t index = 0; tokens_[index].kind != TokenKind::end;) index = Visit(index);
+        Copy(step_.end);
+        return std::move(result_);
+    }
+
+private:
+    // A parenthesis that is open.
+    struct Open {
+        bool is_cast;        // cast(... as TYPE)
+        bool is_columns;     // the columns of a table's definition
+        bool is_type_size;   // the size behind a type's name
+    };
+
+    // Deals with the token, answers the index of the next one.
+    std::size_t Visit(std::size_t index) {
+        const Token& token = tokens_[index];
+        if (token.begin >= step_.cut_begin && token.begin < step_.cut_end) return Drop(index, step_.cut_end);
+        switch (token.kind) {
+            case TokenKind::placeholder: return VisitPlaceholder(index);
+            case TokenKind::q_literal: Replace(token, token.End(), PlainLiteral(token.text)); break;
+            case TokenKind::symbol: VisitSymbol(index); break;
+            case TokenKind::word: return VisitWord(index);
+            default: break;
+        }
+        return index + 1;
+    }
+
+    std::size_t VisitPlaceholder(std::size_t index) {
+        const Token& token = tokens_[index];
+        if (defines_code_) return index + 1;
+        const auto& all = statement_.placeholders;
+        const auto found = std::lower_bound(all.begin(), all.end(), token.begin,
+                                            [](const Placeholder& p, std::size_t begin) { return p.begin < begin; });
+        result_.placeholders.push_back(static_cast<std::uint32_t>(found - all.begin()));
+        const bool has_indicator = IsIndicator(tokens_, index + 1);
+        Replace(token, tokens_[index + has_indicator].End(),
+                dialect_.placeholder_mark + std::to_string(result_.placeholders.size()));
+        return index + 1 + has_indicator;
+    }
+
+    void VisitSymbol(std::size_t index) {
+        const Token& token = tokens_[index];
+        if (token.Is("(")) {
+            const bool columns = names_columns_ && open_.empty();
+            open_.push_back({Previous(index).Is("cast"), columns, type_end_ == index});
+        } else if (token.Is(")")) {
+            if (!open_.empty()) open_.pop_back();
+        } else if (token.Is("*") && !open_.empty() && open_.back().is_type_size) {
+            Replace(token, token.End(), "38");
+        }
+    }
+
+    std::size_t VisitWord(std::size_t index) {
+        const Token& token = tokens_[index];
+        if (IsTypePlace(index)) return VisitType(index);
+        if (!open_.empty() && open_.back().is_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
+        if (token.Is("dual") && Previous(index).Is("from") && !dialect_.has_dual) {
+            Replace(token, token.End(), FollowedByAlias(index) ? "(select 'X' as dummy)" : "(select 'X' as dummy) as dual");
+        } else if (token.Is("for") && step_.locks_rows && !dialect_.has_for_update && open_.empty() &&
+                   At(tokens_, index + 1).Is("update")) {
+            return Drop(index, step_.end);
+        } else if (IsDateLiteral(index)) {
+            return VisitDateLiteral(index);
+        } else if (const auto* spelling = FindFunction(index)) {
+            Replace(token, token.End(), spelling->engine);
+        }
+        return index + 1;
+    }
+
+    // Whether the word stands where a type is named: cast(x as HERE, or behind a column's name in a definition.
+    bool IsTypePlace(std::size_t index) const {
+        if (defines_code_) return false;
+        if (!open_.empty() && open_.back().is_cast) return Previous(index).Is("as");
+        if (!names_columns_ || index < 2) return false;
+        const Token& name = tokens_[index - 1];
+        const Token& before = tokens_[index - 2];
+        if (statement_.type == StatementType::alter && open_.empty() && name.Is("type")) return true;
+        if (name.kind != TokenKind::word && name.kind != TokenKind::quoted_word) return false;
+        if (!open_.empty()) return open_.back().is_columns && (before.Is("(") || before.Is(","));
+        return statement_.type == StatementType::alter && (before.Is("add") || before.Is("column") || before.Is("modify"));
+    }
+
+    std::size_t VisitType(std::size_t index) {
+        std::size_t end = index + 1;
+        for (const auto& spelling : dialect_.types) {
+            const std::size_t matched = MatchWords(index, spelling.written);
+            if (matched == 0) continue;
+            end = index + matched;
+            Replace(tokens_[index], tokens_[end - 1].End(), spelling.engine);
+            break;
+        }
+        type_end_ = end;    // where the size in parentheses may follow
+        return end;
+    }
+
+    // How many tokens the words of `written` are at `index`; 0 when they are not there.
+    std::size_t MatchWords(std::size_t index, std::string_view written) const {
+        std::size_t count = 0;
+        while (!written.empty()) {
+            const std::size_t length = std::min(written.find(' '), written.size());
+            if (!At(tokens_, index + count).Is(written.substr(0, length))) return 0;
+            written.remove_prefix(std::min(length + 1, written.size()));
+            ++count;
+        }
+        return count;
+    }
+
+    bool FollowedByAlias(std::size_t index) const {
+        constexpr std::string_view kClauses[] = {
+            "where", "group", "order", "having", "union", "intersect", "minus", "except", "connect", "start", "limit", "offset",
+            "fetch", "for", "join", "inner", "left", "right", "full", "cross", "natural", "on", "window", "returning"};
+        const Token& next = At(tokens_, index + 1);
+        return next.kind == TokenKind::quoted_word ||
+               (next.kind == TokenKind::word &&
+                std::none_of(std::begin(kClauses), std::end(kClauses), [&](auto word) { return next.Is(word); }));
+    }
+
+    bool IsDateLiteral(std::size_t index) const {
+        return (tokens_[index].Is("date") || tokens_[index].Is("timestamp")) && !dialect_.has_date_literals &&
+               tokens_[index + 1].kind == TokenKind::literal;
+    }
+
+    // date '2024-2-9' becomes the text in which dates are kept; what is no date stays as it is.
+    std::size_t VisitDateLiteral(std::size_t index) {
+        const Token& literal = tokens_[index + 1];
+        date::DateTime value;
+        if (date::FromEngineText(literal.text.substr(1, literal.text.size() - 2), &value) != 0) return index + 2;
+        std::array<char, date::kMaxEngineText + 2> plain{'\''};
+        std::size_t length = 1 + date::ToEngineText(value, plain.data() + 1);
+        plain[length++] = '\'';
+        Replace(tokens_[index], literal.End(), {plain.data(), length});
+        return index + 2;
+    }
+
+    // A word of the dialect's list that stands alone: no name's part, no call, no alias.
+    const engine::Dialect::Spelling* FindFunction(std::size_t index) const {
+        const auto found = std::find_if(dialect_.functions.begin(), dialect_.functions.end(),
+                                        [&](const auto& spelling) { return tokens_[index].Is(spelling.written); });
+        if (found == dialect_.functions.end() || defines_code_) return nullptr;
+        const Token& next = tokens_[index + 1];
+        if (Previous(index).Is(".") || Previous(index).Is("as") || next.Is(".") || next.Is("(")) return nullptr;
+        return &*found;
+    }
+
+    const Token& Previous(std::size_t index) const { return index > 0 ? tokens_[index - 1] : tokens_.back(); }
+
+    void Copy(std::size_t end) {
+        if (end > copied_) result_.sql.append(text_.substr(copied_, end - copied_));
+        copied_ = std::max(copied_, end);
+    }
+
+    void Replace(const Token& first, std::size_t source_end, std::string_view replacement) {
+        Copy(first.begin);
+        const std::size_t begin = result_.sql.size();
+        result_.sql.append(replacement);
+        result_.edits.push_back({first.begin, source_end, begin, result_.sql.size()});
+        copied_ = source_end;
+    }
+
+    // Leaves out the text up to `source_end`; answers the first token behind it.
+    std::size_t Drop(std::size_t index, std::size_t source_end) {
+        Replace(tokens_[index], source_end, "");
+        while (tokens_[index].kind != TokenKind::end && tokens_[index].begin < source_end) ++index;
+        return index;
+    }
+
+    std::string_view text_;
+    const StatementText& statement_;
+    const Step& step_;
+    const engine::Dialect& dialect_;
+    std::vector<Token> tokens_;
+    const bool names_columns_;
+    const bool defines_code_;
+    std::vector<Open> open_;
+    std::size_t type_end_ = std::string_view::npos;
+    std::size_t copied_ = 0;
+    EngineText result_;
+};
+
+}  // namespace
+
+std::uint32_t EngineText::SourceOffset(std::size_t offset) const {
+    const auto after = std::upper_bound(edits.begin(), edits.end(), offset,
+                                        [](std::size_t at, const Edit& edit) { return at < edit.begin; });
+    if (after == edits.begin()) return static_cast<std::uint32_t>(source_begin + offset);
+    const Edit& edit = *(after - 1);
+    return static_cast<std::uint32_t>(offset < edit.end ? edit.source_begin : edit.source_end + (offset - edit.end));
+}
+
+EngineText Rewrite(std::string_view text, const StatementText& statement, const Step& step, const engine::Dialect& dialect) {
+    return Rewriter(text, statement, step, dialect).Result();
+}
+
+}  // namespace sql

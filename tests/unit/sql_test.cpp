@@ -1,0 +1,206 @@
+// SQL text: kinds of statements, placeholders, blocks, and the rewriting into an engine's spellings.
+#include <gtest/gtest.h>
+
+#include <chrono>
+
+#include "sql/engine_text.h"
+#include "sql/statement_text.h"
+
+namespace {
+
+using sql::StatementType;
+
+constexpr engine::Dialect::Spelling kTypes[] = {
+    {"varchar2", "varchar"}, {"number", "numeric"}, {"raw", "blob"}, {"long raw", "blob"}, {"decfloat", "numeric"}};
+constexpr engine::Dialect::Spelling kFunctions[] = {{"sysdate", "(now())"}};
+
+engine::Dialect TestDialect() {
+    engine::Dialect dialect;
+    dialect.types = kTypes;
+    dialect.functions = kFunctions;
+    return dialect;
+}
+
+std::string Rewritten(std::string_view text) {
+    const sql::StatementText statement = sql::Scan(text);
+    std::string all;
+    for (const sql::Step& step : statement.steps) {
+        if (!all.empty()) all += " | ";
+        all += sql::Rewrite(text, statement, step, TestDialect()).sql;
+    }
+    return all;
+}
+
+// Names of the placeholders, "+" before one that repeats, "@" before one that is a row id.
+std::string Names(const sql::StatementText& statement) {
+    std::string names;
+    for (std::size_t index = 0; index < statement.placeholders.size(); ++index) {
+        const sql::Placeholder& placeholder = statement.placeholders[index];
+        if (index > 0) names += ' ';
+        if (placeholder.first != index) names += '+';
+        if (placeholder.is_row_id) names += '@';
+        names += placeholder.name;
+        if (!placeholder.indicator.empty()) names += '/' + placeholder.indicator;
+    }
+    return names;
+}
+
+TEST(SqlText, KindOfStatement) {
+    const struct { const char* text; StatementType type; sql::Run run; int function_code; } cases[] = {
+        {"select 1 from dual", StatementType::select, sql::Run::query, 4},
+        {" -- note\n /* and */ SeLeCt 1", StatementType::select, sql::Run::query, 4},
+        {"(select 1) union (select 2)", StatementType::select, sql::Run::query, 4},
+        {"values(1)", StatementType::select, sql::Run::query, 4},
+        {"with a as (select 1) select * from a", StatementType::select, sql::Run::query, 4},
+        {"with a(x) as (select 1) insert into t select x from a", StatementType::insert, sql::Run::change, 3},
+        {"update t set a = 1", StatementType::update, sql::Run::change, 5},
+        {"delete from t", StatementType::remove, sql::Run::change, 9},
+        {"merge into t using u on (1=1)", StatementType::merge, sql::Run::change, 189},
+        {"create or replace view v as select 1", StatementType::create, sql::Run::definition, 10},
+        {"create unique index i on t(a)", StatementType::create, sql::Run::definition, 20},
+        {"drop table t", StatementType::drop, sql::Run::definition, 8},
+        {"alter table t add c number", StatementType::alter, sql::Run::definition, 26},
+        {"call p(1)", StatementType::call, sql::Run::change, 34},
+        {"begin null; end;", StatementType::begin, sql::Run::nothing, 34},
+        {"begin", StatementType::begin, sql::Run::begin, 34},
+        {"begin transaction;", StatementType::begin, sql::Run::begin, 34},
+        {"commit work", StatementType::unknown, sql::Run::commit, 54},
+        {"rollback", StatementType::unknown, sql::Run::rollback, 55},
+        {"rollback to savepoint a", StatementType::unknown, sql::Run::savepoint, 55},
+        {"savepoint a", StatementType::unknown, sql::Run::savepoint, 56},
+        {"explain select 1", StatementType::unknown, sql::Run::other, 27},
+        {"selection", StatementType::unknown, sql::Run::other, 0},
+        {"", StatementType::unknown, sql::Run::other, 0},
+    };
+    for (const auto& c : cases) {
+        const sql::StatementText statement = sql::Scan(c.text);
+        ASSERT_EQ(statement.steps.size(), 1u) << c.text;
+        EXPECT_EQ(statement.type, c.type) << c.text;
+        EXPECT_EQ(statement.steps[0].run, c.run) << c.text;
+        EXPECT_EQ(statement.function_code, c.function_code) << c.text;
+    }
+}
+
+TEST(SqlText, PlaceholdersOutsideOfQuotesAndComments) {
+    const struct { const char* text; const char* names; } cases[] = {
+        {"select :a, ':b', \":c\", q'[:d']' /* :e */ from t -- :f\n where x = :1", "A 1"},
+        {"insert into t values(?, ?, :x)", "1 2 X"},
+        {"select :name, :NAME, :\"name\"", "NAME +NAME name"},
+        {"insert into t values(:a:ind, :b)", "A/IND B"},
+        {"select 'it''s :a', x::text, :b::text", "B"},
+        {"select * from t where rowid = :r and :s < t.rowid and rowid in (:u, 'x', :v) and a = :w", "@R @S @U @V W"},
+        {"select :\xc3\xa4rger", "\xc3\xa4RGER"},
+        {"create trigger g after insert on t begin insert into l values(:new.a); end;", ""},
+        {"select : a", ""},
+    };
+    for (const auto& c : cases) EXPECT_EQ(Names(sql::Scan(c.text)), c.names) << c.text;
+}
+
+TEST(SqlText, BindPositions) {
+    EXPECT_EQ(sql::Scan("select :a, :b, :a").positions, (std::vector<std::uint32_t>{0, 1, 2}));
+    EXPECT_EQ(sql::Scan("begin :x := :a + :a; :y := :b; end;").positions, (std::vector<std::uint32_t>{0, 1, 3, 4}));
+}
+
+TEST(SqlText, Blocks) {
+    const struct { const char* text; const char* rewritten; } cases[] = {
+        {"begin open :c for select * from t where a = :a; end;", "select * from t where a = ?1"},
+        {"BEGIN OPEN :c FOR select ';' from t; OPEN :d FOR values(:v); END", "select ';' from t | values(?1)"},
+        {"begin insert into t values(:a, :a); commit; end name;", "insert into t values(?1, ?2) | commit"},
+        {"begin :x := :y * 2; null; end;", "?1 * 2 | "},
+        {"begin select a, b into :x, :y from t where c = :z; end;", "select a, b  from t where c = ?1"},
+    };
+    for (const auto& c : cases) {
+        const sql::StatementText statement = sql::Scan(c.text);
+        EXPECT_EQ(statement.error, 0) << c.text;
+        EXPECT_TRUE(statement.is_block) << c.text;
+        EXPECT_EQ(Rewritten(c.text), c.rewritten) << c.text;
+    }
+    EXPECT_EQ(sql::Scan("begin :x := :y * 2; end;").steps[0].targets, std::vector<std::uint32_t>{0});
+    EXPECT_EQ(sql::Scan("begin select a, b into :x, :y from t; end;").steps[0].targets, (std::vector<std::uint32_t>{0, 1}));
+}
+
+TEST(SqlText, ReturningInto) {
+    const char* text = "insert into t values(:a) returning id, b into :id, :b";
+    const sql::StatementText statement = sql::Scan(text);
+    EXPECT_TRUE(statement.Returning());
+    EXPECT_EQ(statement.steps[0].targets, (std::vector<std::uint32_t>{1, 2}));
+    EXPECT_EQ(Rewritten(text), "insert into t values(?1) returning id, b ");
+    EXPECT_FALSE(sql::Scan("insert into t select :a from u").Returning());
+}
+
+TEST(SqlText, WhatTheTextTellsToBeWrong) {
+    const struct { const char* text; int error; unsigned offset; } cases[] = {
+        {"select 'abc", 1756, 7},
+        {"select \"abc", 1756, 7},
+        {"select q'[abc]", 1756, 7},
+        {"select 1; select 2", 933, 10},
+        {"begin open :c for select 1 end;", 6550, 31},
+        {"begin if x then null; end if; end;", 6550, 6},
+        {"begin open :c for ; end;", 6550, 6},
+        {"begin select 1 from t; end;", 6550, 6},
+        {"begin null; end; select 1", 6550, 17},
+        {"begin null;", 6550, 11},
+        {"declare x number; begin null; end;", 6550, 0},
+    };
+    for (const auto& c : cases) {
+        const sql::StatementText statement = sql::Scan(c.text);
+        EXPECT_EQ(statement.error, c.error) << c.text;
+        EXPECT_EQ(statement.error_offset, c.offset) << c.text;
+    }
+    EXPECT_EQ(sql::Scan(std::string_view("select 1\0", 9)).error, 911);
+    EXPECT_EQ(sql::Scan("select 1 ; ;").error, 0);
+}
+
+TEST(SqlText, SpellingsOfTheEngine) {
+    const struct { const char* text; const char* rewritten; } cases[] = {
+        {"select :b, :a, :b from t", "select ?1, ?2, ?3 from t"},
+        {"select sysdate, t.sysdate, sysdate(1), 'sysdate' as sysdate", "select (now()), t.sysdate, sysdate(1), 'sysdate' as sysdate"},
+        {"select 1 from dual", "select 1 from (select 'X' as dummy) as dual"},
+        {"select d.dummy from DUAL d where 1=1", "select d.dummy from (select 'X' as dummy) d where 1=1"},
+        {"create table t(number number(10,2), raw long raw, v varchar2(20 char), x number(*,3))",
+         "create table t(number numeric(10,2), raw blob, v varchar(20 ), x numeric(38,3))"},
+        {"create table t(a number, primary key(number, raw), b number default 1 * 2)",
+         "create table t(a numeric, primary key(number, raw), b numeric default 1 * 2)"},
+        {"alter table number add number number", "alter table number add number numeric"},
+        {"select cast(cast(:1 as decfloat(34)) as varchar2(9)), number, count(*) from t",
+         "select cast(cast(?1 as numeric(34)) as varchar(9)), number, count(*) from t"},
+        {"(select * from t)", "(select * from t)"},
+        {"select q'{it's}', nq'!x!' from t", "select 'it''s', 'x' from t"},
+        {"select a from t for update nowait", "select a from t "},
+        {"insert into t values(date '2024-2-9', timestamp '2024-02-09 10:11:12.5', date 'x')",
+         "insert into t values('2024-02-09 00:00:00', '2024-02-09 10:11:12.5', date 'x')"},
+        {"insert into t values(:a :b, :c:i)", "insert into t values(?1 ?2, ?3)"},
+        {"select 1 ;  ", "select 1"},
+    };
+    for (const auto& c : cases) EXPECT_EQ(Rewritten(c.text), c.rewritten) << c.text;
+}
+
+TEST(SqlText, EngineOffsetsPointIntoTheApplicationsText) {
+    const std::string_view text = "begin open :c for select :abc, sysdate, wrong from dual; end;";
+    const sql::StatementText statement = sql::Scan(text);
+    const sql::EngineText engine = sql::Rewrite(text, statement, statement.steps[0], TestDialect());
+    EXPECT_EQ(engine.SourceOffset(engine.sql.find("wrong")), text.find("wrong"));
+    EXPECT_EQ(engine.SourceOffset(engine.sql.find("now")), text.find("sysdate"));
+    EXPECT_EQ(engine.SourceOffset(0), text.find("select"));
+}
+
+// Deep nesting, quotes that never close, comments within comments, placeholders without end: all linear.
+TEST(SqlText, HostileTextsTakeBoundedTime) {
+    const auto repeat = [](std::string_view piece) {
+        std::string text = "select ";
+        while (text.size() < 200000) text += piece;
+        return text;
+    };
+    const auto start = std::chrono::steady_clock::now();
+    for (const char* piece : {"(", "cast(", "'", "\"", "/*", "--\n", ":a ", "?", "rowid in (", "with ", ";", "for update ",
+                              "q'", "q'[", "e+", "begin ", "into :x,", "rowid = "}) {
+        const std::string text = repeat(piece);
+        const sql::StatementText statement = sql::Scan(text);
+        for (const sql::Step& step : statement.steps) sql::Rewrite(text, statement, step, TestDialect());
+        const sql::StatementText block = sql::Scan("begin " + text);
+        for (const sql::Step& step : block.steps) sql::Rewrite(text, block, step, TestDialect());
+    }
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(30));
+}
+
+}  // namespace
