@@ -11,7 +11,7 @@
 #include <cstdint>
 #include <string_view>
 
-struct OCINumber;
+#include "oci.h"
 
 namespace number {
 
