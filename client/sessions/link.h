@@ -14,7 +14,7 @@ class Link;
 // Somebody who holds queries or other things of the connection: told before it goes.
 class LinkUser {
 public:
-    // Drop what was made from the connection, and the link itself. May not throw.
+    // Drop what was made from the connection; the link is left afterwards. May not throw.
     virtual void LinkClosed() noexcept = 0;
 
 protected:
@@ -54,9 +54,8 @@ public:
     // Stops the call that runs on the connection. From any thread.
     void Cancel() noexcept;
 
-    // Commits or rolls back, drops what depends on the connection and gives the connection up.
-    Status Finish(bool commit);
-    std::unique_ptr<engine::Connection> Close() noexcept;    // the connection, rolled back; null when closed before
+    // Drops what depends on the connection and gives the connection up; null when closed before.
+    std::unique_ptr<engine::Connection> Close() noexcept;
 
     std::unique_ptr<LinkData> statement_cache;
     std::string user;                    // who is logged on; empty: the operating-system user
@@ -64,8 +63,13 @@ public:
 
 private:
     friend class LinkUser;
+    void Add(LinkUser& user) noexcept;
+    void Remove(LinkUser& user) noexcept;
+    LinkUser* AnyUser() noexcept;
+
     std::unique_ptr<engine::Connection> connection_;
     std::shared_ptr<std::recursive_mutex> serial_;
     std::mutex cancel_mutex_;    // between Cancel and the end of the connection
+    std::mutex users_mutex_;
     LinkUser* first_user_ = nullptr;
 };

@@ -1,0 +1,101 @@
+// Server handles: attaching, detaching, connections for sessions.
+#include "sessions/server.h"
+
+#include <utility>
+
+#include "handles/attributes.h"
+#include "oci.h"
+#include "sessions/session.h"
+
+namespace {
+
+constexpr int kAlreadyAttached = 24309;
+constexpr int kNotConnected = 3114;
+
+Status GetNonBlocking(Server& server, AttributeValue& value) {
+    value.integer = server.non_blocking ? 1 : 0;
+    return {};
+}
+
+// Each set toggles, whatever the value.
+Status ToggleNonBlocking(Object& object, const AttributeValue&) {
+    auto& server = static_cast<Server&>(object);
+    server.non_blocking = !server.non_blocking;
+    return {};
+}
+
+Status GetStatus(Server& server, AttributeValue& value) {
+    value.integer = server.Attached() ? OCI_SERVER_NORMAL : OCI_SERVER_NOT_CONNECTED;
+    return {};
+}
+
+Status GetBusy(Server&, AttributeValue&) { return {}; }    // a call that asks has the connection to itself
+
+Status GetInCurrentMode(Server&, AttributeValue& value) {
+    value.integer = 1;
+    return {};
+}
+
+Status GetDatabase(Server& server, AttributeValue& value) {
+    value.text = server.Database();
+    return {};
+}
+
+constexpr AttributeRow kRows[] = {
+    {OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, Get<Server, GetNonBlocking>, ToggleNonBlocking},
+    {OCI_ATTR_INTERNAL_NAME, Shape::text, GetText<&Server::internal_name>, SetText<&Server::internal_name>},
+    {OCI_ATTR_EXTERNAL_NAME, Shape::text, GetText<&Server::external_name>, SetText<&Server::external_name>},
+    {OCI_ATTR_SERVER_GROUP, Shape::text, GetText<&Server::group>, SetText<&Server::group>},
+    {OCI_ATTR_SERVER_STATUS, Shape::ub4, Get<Server, GetStatus>, nullptr},
+    {OCI_ATTR_SERVER_BUSY, Shape::ub1, Get<Server, GetBusy>, nullptr},
+    {OCI_ATTR_IN_V8_MODE, Shape::ub1, Get<Server, GetInCurrentMode>, nullptr},
+    {OCI_ATTR_DBNAME, Shape::text, Get<Server, GetDatabase>, nullptr},
+};
+
+}  // namespace
+
+Server::~Server() { DropSessions(); }
+
+std::span<const AttributeRow> Server::Attributes() const { return kRows; }
+
+Status Server::Attach(std::string_view database) {
+    if (attached_) return Error(kAlreadyAttached);
+    std::unique_ptr<engine::Connection> connection;
+    Status status = engine::Connect(database, connection);
+    if (status.Failed()) return status;
+    database_ = database;
+    version_ = connection->ServerVersion();
+    spare_ = std::move(connection);
+    attached_ = true;
+    return status;
+}
+
+Status Server::Detach() {
+    if (!attached_) return Error(kNotConnected);
+    DropSessions();
+    spare_.reset();
+    attached_ = false;
+    database_.clear();
+    return {};
+}
+
+void Server::DropSessions() noexcept {
+    while (!sessions_.empty()) sessions_.back()->Drop();
+}
+
+Status Server::TakeConnection(std::unique_ptr<engine::Connection>& connection) {
+    if (!attached_) return Error(kNotConnected);
+    if (!spare_) return engine::Connect(database_, connection);
+    connection = std::move(spare_);
+    return {};
+}
+
+void Server::GiveBack(std::unique_ptr<engine::Connection> connection) noexcept {
+    if (attached_ && !spare_) spare_ = std::move(connection);
+}
+
+Status Server::Probe() {
+    if (spare_) return spare_->Ping();
+    for (Session* session : sessions_) return session->GetLink()->Engine().Ping();
+    return Error(kNotConnected);
+}

@@ -1,0 +1,54 @@
+// Server handles: the database that user sessions are begun on.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "engine/engine.h"
+#include "handles/environment.h"
+#include "handles/object.h"
+
+class Session;
+
+class Server : public Object {
+public:
+    static constexpr Kind kKind = Kind::server;
+    explicit Server(const Origin& origin, bool own = false) : Object(origin), own_(own) {}
+    ~Server() override;
+    [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+    [[nodiscard]] bool InUse() const override { return own_ || !sessions_.empty(); }
+
+    [[nodiscard]] bool Attached() const { return attached_; }
+    [[nodiscard]] const std::string& Database() const { return database_; }
+    [[nodiscard]] const std::string& Version() const { return version_; }
+
+    Status Attach(std::string_view database);
+    Status Detach();    // sessions that are still begun are dropped: what they did not commit is rolled back
+
+    // A connection for a session: the one that attaching opened, or a further one.
+    Status TakeConnection(std::unique_ptr<engine::Connection>& connection);
+    void GiveBack(std::unique_ptr<engine::Connection> connection) noexcept;
+    Status Probe();    // one empty round trip
+
+    void Join(Session& session) { sessions_.push_back(&session); }
+    void Leave(Session& session) noexcept { std::erase(sessions_, &session); }
+    [[nodiscard]] const std::vector<Session*>& Sessions() const { return sessions_; }
+
+    std::string internal_name;
+    std::string external_name;
+    std::string group;
+    bool non_blocking = false;
+
+private:
+    void DropSessions() noexcept;
+
+    const bool own_;    // made by a logon and below its service context
+    bool attached_ = false;
+    std::string database_;
+    std::string version_;
+    std::unique_ptr<engine::Connection> spare_;
+    std::vector<Session*> sessions_;    // begun and not ended
+};

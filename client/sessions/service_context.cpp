@@ -1,0 +1,137 @@
+// Service contexts: what they are put together from, and logon in one call.
+#include "sessions/service_context.h"
+
+#include "handles/attributes.h"
+#include "oci.h"
+
+namespace {
+
+constexpr int kNotConnected = 3114;
+constexpr int kNotLoggedOn = 1012;
+constexpr int kReadOnly = 24325;
+constexpr int kBadValue = 24328;
+
+Status GetServerHandle(ServiceContext& service, AttributeValue& value) {
+    value.pointer = service.GetServer();
+    return {};
+}
+
+Status GetSessionHandle(ServiceContext& service, AttributeValue& value) {
+    value.pointer = service.GetSession();
+    return {};
+}
+
+Status GetTransactionHandle(ServiceContext& service, AttributeValue& value) {
+    value.pointer = service.GetTransaction();
+    return {};
+}
+
+// A null pointer takes the handle out of the context; anything else must be a living handle of the kind.
+template <class T, Status (ServiceContext::*setter)(T*)>
+Status SetHandle(Object& object, const AttributeValue& value) {
+    T* handle = Live<T>(value.pointer);
+    if (value.pointer && !handle) return Error(kBadValue);
+    return (static_cast<ServiceContext&>(object).*setter)(handle);
+}
+
+Status GetInCurrentMode(ServiceContext&, AttributeValue& value) {
+    value.integer = 1;
+    return {};
+}
+
+using S = ServiceContext;
+constexpr AttributeRow kRows[] = {
+    {OCI_ATTR_SERVER, Shape::handle, Get<S, GetServerHandle>, SetHandle<Server, &S::SetServer>},
+    {OCI_ATTR_SESSION, Shape::handle, Get<S, GetSessionHandle>, SetHandle<Session, &S::SetSession>},
+    {OCI_ATTR_TRANS, Shape::handle, Get<S, GetTransactionHandle>, SetHandle<TransactionHandle, &S::SetTransaction>},
+    {OCI_ATTR_STMTCACHESIZE, Shape::ub4, GetField<&S::statement_cache_size>, SetField<&S::statement_cache_size>},
+    {OCI_ATTR_IN_V8_MODE, Shape::ub1, Get<S, GetInCurrentMode>, nullptr},
+};
+
+}  // namespace
+
+std::span<const AttributeRow> ServiceContext::Attributes() const { return kRows; }
+
+std::shared_ptr<std::recursive_mutex> ServiceContext::Serial() {
+    Session* session = GetSession();
+    return session ? session->Serial() : nullptr;
+}
+
+Status ServiceContext::RequireServer(Server*& server) {
+    server = GetServer();
+    return server && server->Attached() ? Status() : Error(kNotConnected);
+}
+
+Status ServiceContext::Require(std::shared_ptr<Link>& link) {
+    Session* session = GetSession();
+    if (session && session->Begun()) {
+        link = session->GetLink();
+        return {};
+    }
+    Server* server = nullptr;
+    Status status = RequireServer(server);
+    return status.Failed() ? status : Error(kNotLoggedOn);
+}
+
+Status ServiceContext::SetServer(Server* server) {
+    if (logged_on_) return Error(kReadOnly);
+    server_ = server;
+    return {};
+}
+
+Status ServiceContext::SetSession(Session* session) {
+    if (logged_on_) return Error(kReadOnly);
+    session_ = session;
+    return {};
+}
+
+Status ServiceContext::SetTransaction(TransactionHandle* transaction) {
+    transaction_ = transaction;
+    return {};
+}
+
+Server& ServiceContext::OwnServer() {
+    if (!own_server_) own_server_ = Create<Server>(*this, OCI_HTYPE_SERVER, 0, true);
+    return *own_server_;
+}
+
+Session& ServiceContext::OwnSession() {
+    if (!own_session_) own_session_ = Create<Session>(*this, OCI_HTYPE_SESSION, 0, true);
+    return *own_session_;
+}
+
+Status ServiceContext::LogOn(std::string_view database, const engine::Credentials& credentials) {
+    if (logged_on_) {
+        Status ended = LogOff();
+        if (ended.Failed()) return ended;
+    }
+    Server& server = OwnServer();
+    Session& session = OwnSession();
+    Status status = server.Attach(database);
+    if (status.Failed()) return status;
+    status = session.Begin(server, credentials);
+    if (status.Failed()) {
+        (void)server.Detach();    // it has nothing open: the logon's own error is what counts
+        return status;
+    }
+    session.user = credentials.user;
+    server_ = &server;
+    session_ = &session;
+    logged_on_ = true;
+    return status;
+}
+
+Status ServiceContext::LogOff() {
+    std::shared_ptr<Link> link;
+    Status status = Require(link);
+    if (status.Failed()) return status;
+    status = GetSession()->End();
+    if (status.Failed()) return status;
+    if (logged_on_) {
+        logged_on_ = false;
+        statement_cache_size = 0;
+        server_ = session_ = nullptr;
+        return own_server_->Detach();
+    }
+    return status;
+}

@@ -1,0 +1,90 @@
+// User sessions: begin and end.
+#include "sessions/session.h"
+
+#include <utility>
+
+#include "handles/attributes.h"
+#include "oci.h"
+#include "sessions/server.h"
+
+namespace {
+
+constexpr int kAlreadyAuthenticated = 24313;
+constexpr int kNotLoggedOn = 1012;
+
+Status GetOpenStatements(Session& session, AttributeValue& value) {
+    value.integer = session.Begun() ? session.GetLink()->open_statements : 0;
+    return {};
+}
+
+// Kept, so that applications written for it run; there is nothing here that it would choose.
+Status TakeAny(Object&, const AttributeValue&) { return {}; }
+
+using S = Session;
+constexpr AttributeRow kRows[] = {
+    {OCI_ATTR_USERNAME, Shape::text, GetText<&S::user>, SetText<&S::user>},
+    {OCI_ATTR_PASSWORD, Shape::text, nullptr, SetText<&S::password>},
+    {OCI_ATTR_NUM_OPEN_STMTS, Shape::ub4, Get<S, GetOpenStatements>, nullptr},
+    {OCI_ATTR_CLIENT_IDENTIFIER, Shape::text, nullptr, SetText<&S::client_identifier>},
+    {OCI_ATTR_MODULE, Shape::text, nullptr, SetText<&S::module>},
+    {OCI_ATTR_ACTION, Shape::text, nullptr, SetText<&S::action>},
+    {OCI_ATTR_CLIENT_INFO, Shape::text, nullptr, SetText<&S::client_info>},
+    {OCI_ATTR_DRIVER_NAME, Shape::text, nullptr, SetText<&S::driver_name>},
+    {OCI_ATTR_CONNECTION_CLASS, Shape::text, GetText<&S::connection_class>, SetText<&S::connection_class>},
+    {OCI_ATTR_CURRENT_SCHEMA, Shape::text, GetText<&S::current_schema>, SetText<&S::current_schema>},
+    {OCI_ATTR_EDITION, Shape::text, GetText<&S::edition>, SetText<&S::edition>},
+    {OCI_ATTR_PURITY, Shape::ub4, GetField<&S::purity>, SetField<&S::purity>},
+    {OCI_ATTR_MIGSESSION, Shape::handle, nullptr, TakeAny},
+    {OCI_ATTR_PROXY_CREDENTIALS, Shape::handle, nullptr, TakeAny},
+};
+
+}  // namespace
+
+Session::~Session() { Drop(); }
+
+std::span<const AttributeRow> Session::Attributes() const { return kRows; }
+
+std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_ ? link_->Serial() : nullptr; }
+
+Status Session::Begin(Server& server, const engine::Credentials& credentials) {
+    if (Begun()) return Error(kAlreadyAuthenticated);
+    std::unique_ptr<engine::Connection> connection;
+    Status status = server.TakeConnection(connection);
+    if (status.Failed()) return status;
+    status = connection->Authenticate(credentials);
+    if (status.Failed()) {
+        server.GiveBack(std::move(connection));
+        return status;
+    }
+    return Adopt(server, std::move(connection), credentials.external ? std::string() : credentials.user);
+}
+
+Status Session::Adopt(Server& server, std::unique_ptr<engine::Connection> connection, std::string user_name) {
+    auto link = std::make_shared<Link>(std::move(connection), Env().Threaded());
+    link->user = std::move(user_name);
+    server.Join(*this);
+    server_ = &server;
+    link_ = std::move(link);
+    return {};
+}
+
+Status Session::End() {
+    if (!Begun()) return Error(kNotLoggedOn);
+    Status status = link_->Engine().Commit();
+    if (!status.Failed()) Close();
+    return status;
+}
+
+void Session::Drop() noexcept {
+    if (!Begun()) return;
+    Close();
+}
+
+void Session::Close() noexcept {
+    std::unique_ptr<engine::Connection> connection = link_->Close();
+    link_.reset();
+    Server* server = std::exchange(server_, nullptr);
+    server->Leave(*this);
+    if (connection->InTransaction() && connection->Rollback().Failed()) return;    // no use to anybody
+    server->GiveBack(std::move(connection));
+}

@@ -1,0 +1,52 @@
+// User sessions: who is logged on, and the link that the session's work runs on. Session handles also carry the names and
+// passwords for pools (they are authentication handles).
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "engine/engine.h"
+#include "handles/environment.h"
+#include "handles/object.h"
+#include "sessions/link.h"
+
+class Server;
+
+class Session : public Object {
+public:
+    static constexpr Kind kKind = Kind::session;
+    explicit Session(const Origin& origin, bool own = false) : Object(origin), own_(own) {}
+    ~Session() override;
+    [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
+    [[nodiscard]] bool InUse() const override { return own_; }
+
+    [[nodiscard]] bool Begun() const { return link_ != nullptr; }
+    [[nodiscard]] const std::shared_ptr<Link>& GetLink() const { return link_; }    // null until begun
+
+    Status Begin(Server& server, const engine::Credentials& credentials);
+    // Begins with a connection on which the user has proved who he is.
+    Status Adopt(Server& server, std::unique_ptr<engine::Connection> connection, std::string user_name);
+    Status End();             // commits; an error leaves the session as it was
+    void Drop() noexcept;     // rolls back
+
+    std::string user;
+    std::string password;
+    std::string client_identifier;
+    std::string module;
+    std::string action;
+    std::string client_info;
+    std::string driver_name;
+    std::string connection_class;
+    std::string current_schema;
+    std::string edition;
+    std::uint32_t purity = 0;
+
+private:
+    void Close() noexcept;
+
+    const bool own_;
+    std::shared_ptr<Link> link_;
+    Server* server_ = nullptr;    // while begun
+};
