@@ -18,7 +18,7 @@ namespace date {
 using Errno = int;    // a published error number; 0: success
 
 constexpr Errno kBadDayForMonth = 1839;
-constexpr Errno kBadYear = 1841;
+constexpr Errno kBadYear = 1841;            // also a result before the year -4712 or after 9999
 constexpr Errno kBadMonth = 1843;
 constexpr Errno kBadWeekday = 1846;
 constexpr Errno kBadDay = 1847;
@@ -27,9 +27,7 @@ constexpr Errno kBadMinute = 1851;
 constexpr Errno kBadSecond = 1852;
 constexpr Errno kNotInCalendar = 1864;      // a day that the calendar does not have: 5 to 14 October 1582
 constexpr Errno kBadFraction = 1880;
-constexpr Errno kOutOfRange = 1891;         // a result before the year -4712 or after 9999
-constexpr Errno kBadText = 1861;            // a text that is not of the engine form
-constexpr Errno kBadDateBytes = 1801;       // seven bytes that are no date
+constexpr Errno kBadText = 1861;            // a text that is not of the form wanted
 
 constexpr int kMinYear = -4712;
 constexpr int kMaxYear = 9999;
@@ -62,8 +60,8 @@ Errno ValidateDate(const DateTime& value) noexcept;
 Errno ValidateTime(const DateTime& value) noexcept;
 Errno Validate(const DateTime& value) noexcept;
 
-// Days in a fixed count, the astronomers' Julian day number: 1 January 4712 BC is 0, 15 October 1582 is 2299161. The
-// model element J and the last day 9999-12-31 count one more than this.
+// Days in one unbroken count, the astronomers' Julian day number: 1 January 4712 BC is 366 (no year 0 is counted),
+// 15 October 1582 is 2299161, 31 December 9999 is 5373484.
 using DayNumber = std::int32_t;
 DayNumber ToDayNumber(int year, int month, int day) noexcept;
 void FromDayNumber(DayNumber number, DateTime* value) noexcept;    // sets year, month and day alone

@@ -1,0 +1,191 @@
+// The calendar: day numbers, checks, arithmetic. The two conversions between dates and day numbers are the usual integer
+// formulas for the Julian and the Gregorian calendar, on years that astronomers count (1 BC is 0).
+#include "date/date.h"
+
+#include <ctime>
+
+#include "oci_constants.h"
+
+namespace date {
+namespace {
+
+constexpr DayNumber kFirstGregorianDay = 2299161;    // 15 October 1582
+constexpr int kReformYear = 1582;
+constexpr int kReformMonth = 10;
+constexpr int kLastJulianDay = 4;
+constexpr int kFirstGregorianDayOfMonth = 15;
+constexpr DayNumber kMinDay = 366;                   // 1 January 4712 BC
+constexpr DayNumber kMaxDay = 5373484;               // 31 December 9999
+
+int AstronomicalYear(int year) { return year > 0 ? year : year + 1; }
+int CalendarYear(int astronomical_year) { return astronomical_year > 0 ? astronomical_year : astronomical_year - 1; }
+
+bool IsGregorian(int year, int month, int day) {
+    if (year != kReformYear) return year > kReformYear;
+    if (month != kReformMonth) return month > kReformMonth;
+    return day > kLastJulianDay;
+}
+
+bool IsLeap(int year) {
+    const int astronomical = AstronomicalYear(year);
+    if (astronomical % 4 != 0) return false;
+    return year <= kReformYear || year % 100 != 0 || year % 400 == 0;
+}
+
+bool IsMissing(int year, int month, int day) {
+    return year == kReformYear && month == kReformMonth && day > kLastJulianDay && day < kFirstGregorianDayOfMonth;
+}
+
+Flags Pair(bool below, bool above, Flags invalid, Flags below_valid) {
+    return below ? invalid | below_valid : above ? invalid : 0;
+}
+
+// The first of the month, `months` after that of `value`, and whether the year can be had.
+bool MoveMonths(const DateTime& value, std::int64_t months, int* year, int* month) {
+    constexpr std::int64_t kMonths = std::int64_t{12} * (kMaxYear - kMinYear + 1);
+    if (months > kMonths || months < -kMonths) return false;
+    const std::int64_t moved = std::int64_t{12} * (AstronomicalYear(value.year) - kMinYear) + value.month - 1 + months;
+    if (moved < 0) return false;
+    *year = CalendarYear(static_cast<int>(moved / 12) + kMinYear);
+    *month = static_cast<int>(moved % 12) + 1;
+    return *year >= kMinYear && *year <= kMaxYear;
+}
+
+void SetDay(int year, int month, int day, DateTime* value) {
+    value->year = static_cast<std::int16_t>(year);
+    value->month = static_cast<std::uint8_t>(month);
+    value->day = static_cast<std::uint8_t>(day);
+}
+
+template <class T>
+int Order(const T& left, const T& right) { return left < right ? -1 : right < left; }
+
+}  // namespace
+
+Flags CheckDate(const DateTime& value) noexcept {
+    Flags flags = Pair(value.year < kMinYear, value.year > kMaxYear, OCI_DATE_INVALID_YEAR, OCI_DATE_YEAR_BELOW_VALID);
+    if (value.year == 0) flags |= OCI_DATE_YEAR_ZERO;
+    flags |= Pair(value.month < 1, value.month > 12, OCI_DATE_INVALID_MONTH, OCI_DATE_MONTH_BELOW_VALID);
+    const int last_day = value.month < 1 || value.month > 12 ? 31 : DaysInMonth(value.year, value.month);
+    flags |= Pair(value.day < 1, value.day > last_day, OCI_DATE_INVALID_DAY, OCI_DATE_DAY_BELOW_VALID);
+    if (IsMissing(value.year, value.month, value.day)) flags |= OCI_DATE_DAY_MISSING_FROM_1582;
+    return flags;
+}
+
+Flags CheckTime(const DateTime& value) noexcept {
+    return Pair(false, value.hour > 23, OCI_DATE_INVALID_HOUR, 0) |
+           Pair(false, value.minute > 59, OCI_DATE_INVALID_MINUTE, 0) |
+           Pair(false, value.second > 59, OCI_DATE_INVALID_SECOND, 0);
+}
+
+Errno ValidateDate(const DateTime& value) noexcept {
+    if (value.year < kMinYear || value.year > kMaxYear || value.year == 0) return kBadYear;
+    if (value.month < 1 || value.month > 12) return kBadMonth;
+    if (value.day < 1 || value.day > 31) return kBadDay;
+    if (value.day > 28 && value.day > DaysInMonth(value.year, value.month)) return kBadDayForMonth;
+    return IsMissing(value.year, value.month, value.day) ? kNotInCalendar : 0;
+}
+
+Errno ValidateTime(const DateTime& value) noexcept {
+    if (value.hour > 23) return kBadHour;
+    if (value.minute > 59) return kBadMinute;
+    if (value.second > 59) return kBadSecond;
+    return value.nanosecond > 999'999'999 ? kBadFraction : 0;
+}
+
+Errno Validate(const DateTime& value) noexcept {
+    const Errno number = ValidateDate(value);
+    return number ? number : ValidateTime(value);
+}
+
+DayNumber ToDayNumber(int year, int month, int day) noexcept {
+    const int before_march = month < 3;
+    const int shifted_year = AstronomicalYear(year) + 4800 - before_march;
+    const int day_of_year = (153 * (month + 12 * before_march - 3) + 2) / 5 + day;
+    const int julian = day_of_year + 365 * shifted_year + shifted_year / 4;
+    if (!IsGregorian(year, month, day)) return julian - 32083;
+    return julian - shifted_year / 100 + shifted_year / 400 - 32045;
+}
+
+void FromDayNumber(DayNumber number, DateTime* value) noexcept {
+    int shifted = number + 1401;
+    if (number >= kFirstGregorianDay) shifted += (4 * number + 274277) / 146097 * 3 / 4 - 38;
+    const int quarter_days = 4 * shifted + 3;
+    const int fifths = 5 * (quarter_days % 1461 / 4) + 2;
+    const int month = (fifths / 153 + 2) % 12 + 1;
+    SetDay(CalendarYear(quarter_days / 1461 - 4716 + (14 - month) / 12), month, fifths % 153 / 5 + 1, value);
+}
+
+int DaysInMonth(int year, int month) noexcept {
+    constexpr int kDays[] = {31, 28, 31, 30, 31, 30, 31, 31, 30, 31, 30, 31};
+    return month == 2 && IsLeap(year) ? 29 : kDays[month - 1];
+}
+
+int DayOfWeek(DayNumber number) noexcept { return (number + 1) % 7; }
+
+int DayOfYear(const DateTime& value) noexcept { return ToDayNumber(value) - ToDayNumber(value.year, 1, 1) + 1; }
+
+Errno AddDays(const DateTime& value, std::int64_t days, DateTime* result) noexcept {
+    if (const Errno number = Validate(value)) return number;
+    const DayNumber day = ToDayNumber(value);
+    if (days < kMinDay - day || days > kMaxDay - day) return kBadYear;
+    *result = value;
+    FromDayNumber(day + static_cast<DayNumber>(days), result);
+    return 0;
+}
+
+// A day that falls among the missing ones of October 1582 becomes the first after them.
+Errno AddMonths(const DateTime& value, std::int64_t months, DateTime* result) noexcept {
+    if (const Errno number = Validate(value)) return number;
+    int year = 0, month = 0;
+    if (!MoveMonths(value, months, &year, &month)) return kBadYear;
+    const int last_day = DaysInMonth(year, month);
+    int day = value.day;
+    if (day > last_day || day == DaysInMonth(value.year, value.month)) day = last_day;
+    if (IsMissing(year, month, day)) day = kFirstGregorianDayOfMonth;
+    *result = value;
+    SetDay(year, month, day, result);
+    return 0;
+}
+
+Errno LastDay(const DateTime& value, DateTime* result) noexcept {
+    if (const Errno number = Validate(value)) return number;
+    *result = value;
+    result->day = static_cast<std::uint8_t>(DaysInMonth(value.year, value.month));
+    return 0;
+}
+
+Errno NextDay(const DateTime& value, int day_of_week, DateTime* result) noexcept {
+    if (const Errno number = Validate(value)) return number;
+    const int days = (day_of_week - DayOfWeek(ToDayNumber(value)) + 7) % 7;
+    return AddDays(value, days == 0 ? 7 : days, result);
+}
+
+std::int32_t DaysBetween(const DateTime& left, const DateTime& right) noexcept {
+    return ToDayNumber(left) - ToDayNumber(right);
+}
+
+int Compare(const DateTime& left, const DateTime& right) noexcept {
+    const auto seconds = [](const DateTime& value) {
+        return ((((value.year * 16LL + value.month) * 32 + value.day) * 32 + value.hour) * 64 + value.minute) * 64 +
+               value.second;
+    };
+    const int order = Order(seconds(left), seconds(right));
+    return order ? order : Order(left.nanosecond, right.nanosecond);
+}
+
+DateTime Now() noexcept {
+    timespec now{};
+    clock_gettime(CLOCK_REALTIME, &now);
+    std::tm local{};
+    localtime_r(&now.tv_sec, &local);
+    DateTime value;
+    SetDay(local.tm_year + 1900, local.tm_mon + 1, local.tm_mday, &value);
+    value.hour = static_cast<std::uint8_t>(local.tm_hour);
+    value.minute = static_cast<std::uint8_t>(local.tm_min);
+    value.second = static_cast<std::uint8_t>(local.tm_sec > 59 ? 59 : local.tm_sec);    // a leap second
+    value.nanosecond = static_cast<std::uint32_t>(now.tv_nsec);
+    return value;
+}
+
+}  // namespace date

@@ -1,0 +1,196 @@
+// The forms of a date that need no model: OCIDate, the seven bytes, the engines' text.
+#include "date/date.h"
+#include "oci_types.h"
+
+namespace date {
+namespace {
+
+char* PutTwo(char* text, unsigned value) {
+    text[0] = static_cast<char>('0' + value / 10 % 10);
+    text[1] = static_cast<char>('0' + value % 10);
+    return text + 2;
+}
+
+char* PutFraction(char* text, std::uint32_t nanosecond) {
+    *text++ = '.';
+    for (std::uint32_t place = 100'000'000; nanosecond > 0; place /= 10) {
+        *text++ = static_cast<char>('0' + nanosecond / place);
+        nanosecond %= place;
+    }
+    return text;
+}
+
+char* PutZone(char* text, int minutes) {
+    *text++ = ' ';
+    *text++ = minutes < 0 ? '-' : '+';
+    const auto distance = static_cast<unsigned>(minutes < 0 ? -minutes : minutes);
+    text = PutTwo(text, distance / 60);
+    *text++ = ':';
+    return PutTwo(text, distance % 60);
+}
+
+// Reads an engine's text from the left. A member that does not find what it looks for moves nothing.
+class Reader {
+public:
+    explicit Reader(std::string_view text) : text_(text) {}
+
+    [[nodiscard]] bool AtEnd() const { return text_.empty(); }
+
+    bool Take(char wanted) {
+        if (text_.empty() || text_.front() != wanted) return false;
+        text_.remove_prefix(1);
+        return true;
+    }
+
+    // One to `most` digits.
+    bool Number(std::size_t most, int* value) {
+        std::size_t count = 0;
+        for (*value = 0; count < text_.size() && count < most && IsDigit(text_[count]); ++count) {
+            *value = *value * 10 + (text_[count] - '0');
+        }
+        text_.remove_prefix(count);
+        return count > 0;
+    }
+
+    bool SmallNumber(std::uint8_t* value) {
+        int number = 0;
+        if (!Number(2, &number)) return false;
+        *value = static_cast<std::uint8_t>(number);
+        return true;
+    }
+
+    // Any number of digits; what is below a nanosecond is dropped.
+    bool Fraction(std::uint32_t* nanosecond) {
+        std::size_t count = 0;
+        std::uint32_t place = 100'000'000;
+        for (*nanosecond = 0; count < text_.size() && IsDigit(text_[count]); ++count, place /= 10) {
+            *nanosecond += place * static_cast<std::uint32_t>(text_[count] - '0');
+        }
+        text_.remove_prefix(count);
+        return count > 0;
+    }
+
+private:
+    static bool IsDigit(char c) { return c >= '0' && c <= '9'; }
+    std::string_view text_;
+};
+
+bool ReadTimeAfterHour(Reader& reader, DateTime* value) {
+    if (!reader.Take(':') || !reader.SmallNumber(&value->minute)) return false;
+    if (reader.Take(':') && !reader.SmallNumber(&value->second)) return false;
+    return !reader.Take('.') || reader.Fraction(&value->nanosecond);
+}
+
+// Seconds of an offset, as zones had them before 1900, are dropped.
+bool ReadZone(Reader& reader, DateTime* value) {
+    reader.Take(' ');
+    value->has_zone = true;
+    if (reader.Take('Z')) return true;
+    const bool west = reader.Take('-');
+    int hours = 0, minutes = 0, seconds = 0;
+    if ((!west && !reader.Take('+')) || !reader.Number(2, &hours)) return false;
+    if (reader.Take(':') || !reader.AtEnd()) {
+        if (!reader.Number(2, &minutes)) return false;
+        if (reader.Take(':') && !reader.Number(2, &seconds)) return false;
+    }
+    value->zone_minutes = static_cast<std::int16_t>((west ? -1 : 1) * (hours * 60 + minutes));
+    return hours < 16 && minutes < 60;
+}
+
+bool ReadTime(Reader& reader, DateTime* value) {
+    return ReadTimeAfterHour(reader, value) && (reader.AtEnd() || ReadZone(reader, value)) && reader.AtEnd();
+}
+
+bool ReadDateAfterYear(Reader& reader, DateTime* value) {
+    if (!reader.SmallNumber(&value->month) || !reader.Take('-') || !reader.SmallNumber(&value->day)) return false;
+    if (reader.AtEnd()) return true;
+    return (reader.Take(' ') || reader.Take('T')) && reader.SmallNumber(&value->hour) && ReadTime(reader, value);
+}
+
+}  // namespace
+
+DateTime FromOciDate(const OCIDate& value) noexcept {
+    DateTime result;
+    result.year = value.OCIDateYYYY;
+    result.month = value.OCIDateMM;
+    result.day = value.OCIDateDD;
+    result.hour = value.OCIDateTime.OCITimeHH;
+    result.minute = value.OCIDateTime.OCITimeMI;
+    result.second = value.OCIDateTime.OCITimeSS;
+    return result;
+}
+
+void ToOciDate(const DateTime& value, OCIDate* result) noexcept {
+    result->OCIDateYYYY = value.year;
+    result->OCIDateMM = value.month;
+    result->OCIDateDD = value.day;
+    result->OCIDateTime = {value.hour, value.minute, value.second};
+}
+
+Errno FromBytes(const std::uint8_t* bytes, DateTime* result) noexcept {
+    DateTime value;
+    value.year = static_cast<std::int16_t>((bytes[0] - 100) * 100 + (bytes[1] - 100));
+    value.month = bytes[2];
+    value.day = bytes[3];
+    value.hour = static_cast<std::uint8_t>(bytes[4] - 1);    // 0 becomes 255, which no check lets pass
+    value.minute = static_cast<std::uint8_t>(bytes[5] - 1);
+    value.second = static_cast<std::uint8_t>(bytes[6] - 1);
+    if (const Errno number = Validate(value)) return number;
+    *result = value;
+    return 0;
+}
+
+void ToBytes(const DateTime& value, std::uint8_t* bytes) noexcept {
+    bytes[0] = static_cast<std::uint8_t>(value.year / 100 + 100);    // division towards 0: -4712 is 53, 88
+    bytes[1] = static_cast<std::uint8_t>(value.year % 100 + 100);
+    bytes[2] = value.month;
+    bytes[3] = value.day;
+    bytes[4] = static_cast<std::uint8_t>(value.hour + 1);
+    bytes[5] = static_cast<std::uint8_t>(value.minute + 1);
+    bytes[6] = static_cast<std::uint8_t>(value.second + 1);
+}
+
+std::size_t ToEngineText(const DateTime& value, char* text) noexcept {
+    char* end = text;
+    if (value.year < 0) *end++ = '-';
+    const auto year = static_cast<unsigned>(value.year < 0 ? -value.year : value.year);
+    end = PutTwo(PutTwo(end, year / 100), year);
+    *end++ = '-';
+    end = PutTwo(end, value.month);
+    *end++ = '-';
+    end = PutTwo(end, value.day);
+    *end++ = ' ';
+    end = PutTwo(end, value.hour);
+    *end++ = ':';
+    end = PutTwo(end, value.minute);
+    *end++ = ':';
+    end = PutTwo(end, value.second);
+    if (value.nanosecond > 0) end = PutFraction(end, value.nanosecond);
+    if (value.has_zone) end = PutZone(end, value.zone_minutes);
+    return static_cast<std::size_t>(end - text);
+}
+
+Errno FromEngineText(std::string_view text, DateTime* result) noexcept {
+    constexpr std::string_view kBeforeChrist = " BC";
+    const bool named_era = text.ends_with(kBeforeChrist);
+    if (named_era) text.remove_suffix(kBeforeChrist.size());
+    Reader reader(text);
+    const bool before_christ = reader.Take('-') || named_era;
+    int first = 0;
+    if (!reader.Number(6, &first)) return kBadText;
+    if (first > kMaxYear) return kBadYear;
+    DateTime value;
+    if (reader.Take('-')) {
+        value.year = static_cast<std::int16_t>(before_christ ? -first : first);
+        if (!ReadDateAfterYear(reader, &value)) return kBadText;
+        if (const Errno number = Validate(value)) return number;
+    } else {
+        value.hour = static_cast<std::uint8_t>(first);
+        if (first > 99 || before_christ || !ReadTime(reader, &value)) return kBadText;
+        if (const Errno number = ValidateTime(value)) return number;
+    }
+    *result = value;
+    return 0;
+}
+
+}  // namespace date
