@@ -2,6 +2,7 @@
 #include "handles/environment.h"
 
 #include <cstdlib>
+#include <cstring>
 
 #include "handles/attributes.h"
 #include "oci.h"
@@ -12,15 +13,18 @@ std::atomic<std::int64_t> held_blocks{0};
 
 constexpr std::size_t kAlignment = 16;
 
+constexpr std::size_t kLargestBlock = std::size_t{1} << 36;    // what is larger is a mistake of the caller's
+
 // The application's functions may align to less than objects need: their block's own address stands before ours.
 void* AllocateFrom(const MemoryFunctions& memory, std::size_t size) noexcept {
-    if (size > SIZE_MAX - 2 * kAlignment) return nullptr;
-    if (!memory.allocate) return std::malloc(size ? size : 1);
+    if (size > kLargestBlock) return nullptr;
+    if (!memory.allocate) return std::calloc(1, size ? size : 1);
     void* block = memory.allocate(memory.context, size + 2 * kAlignment);
     if (!block) return nullptr;
     const auto address = (reinterpret_cast<std::uintptr_t>(block) + 2 * kAlignment - 1) / kAlignment * kAlignment;
     auto** aligned = reinterpret_cast<void**>(address);
     aligned[-1] = block;
+    std::memset(aligned, 0, size);
     return aligned;
 }
 

@@ -24,6 +24,8 @@ class Environment : public Object {
 public:
     static constexpr Kind kKind = Kind::environment;
 
+    [[nodiscard]] const MemoryFunctions& Memory() const { return memory_; }
+
     // Null when memory fails. The environment lies in memory of the functions given.
     static Environment* Open(std::uint32_t mode, const MemoryFunctions& memory, std::size_t extra) noexcept;
 
@@ -32,11 +34,16 @@ public:
     [[nodiscard]] bool Threaded() const { return threaded_; }
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
 
-    // Memory that lives at most as long as the environment: 16-byte aligned, counted. Throws std::bad_alloc.
+    // Memory that lives at most as long as the environment: zeroed, 16-byte aligned, counted. Throws std::bad_alloc.
     void* Allocate(std::size_t size);
     void Release(void* memory) noexcept;    // null is harmless
 
-    ErrorList errors;    // of calls without an error handle
+    // The records of calls without an error handle; several threads may make such calls.
+    struct SharedErrors {
+        std::mutex mutex;
+        ErrorList list;
+    };
+    SharedErrors errors;
 
     // Kept for the application, without effect here.
     std::uint32_t cache_optimal_size = 8388608;

@@ -90,3 +90,15 @@ sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
     if (kind != Kind::environment && kind != Kind::session) return OCI_INVALID_HANDLE;
     return Guard(error->list, [&] { return body(Live<Object>(handle)->Env()); });
 }
+
+// Calls that have nothing but a parent environment; what goes wrong is recorded there: body(Environment&).
+template <class Body>
+sword EnterEnvironment(const void* parent, Body&& body) noexcept {
+    Environment* environment = Live<Environment>(parent);
+    if (!environment) return OCI_INVALID_HANDLE;
+    ErrorList records;
+    const sword code = Guard(records, [&] { return body(*environment); });
+    const std::lock_guard lock(environment->errors.mutex);
+    environment->errors.list = std::move(records);
+    return code;
+}

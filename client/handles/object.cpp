@@ -1,8 +1,6 @@
 // The tree of objects: who hangs below whom, what dies with what.
 #include "handles/object.h"
 
-#include <cstring>
-
 #include "handles/environment.h"
 
 std::string& Object::KeptText(std::uint32_t attribute) {
@@ -25,7 +23,6 @@ void ObjectTree::Adopt(Object& object, Kind kind, std::size_t extra) {
         environment.Release(user_memory);
         throw;
     }
-    if (user_memory) std::memset(user_memory, 0, extra);
     object.user_memory_ = user_memory;
     if (!object.parent_) return;
     const std::lock_guard lock(environment.tree_mutex_);

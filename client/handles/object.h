@@ -24,7 +24,7 @@ using TypeCode = std::uint32_t;    // OCI_HTYPE_* or OCI_DTYPE_*; 0 for objects 
 enum class Kind : std::uint8_t {
     none,
     environment, error, service_context, statement, bind, define, describe, server, session, transaction,
-    connection_pool, session_pool, plain_handle,
+    connection_pool, session_pool, plain_handle, descriptor_array,
     lob, snapshot, result_set, parameter, row_id, datetime, interval, plain_descriptor,
     string, raw, file, thread_mutex, thread_key, thread_id, thread_handle
 };

@@ -93,9 +93,3 @@ Status Server::TakeConnection(std::unique_ptr<engine::Connection>& connection) {
 void Server::GiveBack(std::unique_ptr<engine::Connection> connection) noexcept {
     if (attached_ && !spare_) spare_ = std::move(connection);
 }
-
-Status Server::Probe() {
-    if (spare_) return spare_->Ping();
-    for (Session* session : sessions_) return session->GetLink()->Engine().Ping();
-    return Error(kNotConnected);
-}

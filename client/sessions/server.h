@@ -31,7 +31,6 @@ public:
     // A connection for a session: the one that attaching opened, or a further one.
     Status TakeConnection(std::unique_ptr<engine::Connection>& connection);
     void GiveBack(std::unique_ptr<engine::Connection> connection) noexcept;
-    Status Probe();    // one empty round trip
 
     void Join(Session& session) { sessions_.push_back(&session); }
     void Leave(Session& session) noexcept { std::erase(sessions_, &session); }

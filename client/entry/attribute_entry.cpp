@@ -1,0 +1,28 @@
+// OCIAttrGet and OCIAttrSet.
+#include "handles/attributes.h"
+#include "handles/gate.h"
+#include "oci.h"
+
+namespace {
+
+// A call that asks an error handle about itself leaves its records alone.
+template <class Body>
+sword EnterAttribute(const void* object, ub4 type, OCIError* errhp, Body&& body) noexcept {
+    ErrorHandle* error = Live<ErrorHandle>(errhp);
+    if (!error) return OCI_INVALID_HANDLE;
+    Object* target = Live<Object>(object);
+    if (static_cast<const Object*>(error) != target) error->list.Clear();
+    if (!target || target->Type() != type) return OCI_INVALID_HANDLE;
+    const SerialLock lock(target->Serial());
+    return Guard(error->list, [&] { return body(*target); });
+}
+
+}  // namespace
+
+sword OCIAttrGet(const dvoid* hndl, ub4 type, dvoid* value, ub4* size, ub4 attr, OCIError* err) {
+    return EnterAttribute(hndl, type, err, [&](Object& object) { return GetAttribute(object, value, size, attr); });
+}
+
+sword OCIAttrSet(dvoid* hndl, ub4 type, dvoid* value, ub4 size, ub4 attr, OCIError* err) {
+    return EnterAttribute(hndl, type, err, [&](Object& object) { return SetAttribute(object, value, size, attr); });
+}

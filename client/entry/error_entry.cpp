@@ -1,0 +1,54 @@
+// Reading error records: OCIErrorGet.
+#include <cstring>
+#include <mutex>
+
+#include "handles/gate.h"
+#include "oci.h"
+
+namespace {
+
+// Five characters, no terminator: callers' areas have room for no more.
+void StoreState(const Environment& environment, int number, OraText* target) {
+    std::string converted;
+    const std::string_view state = TextOut(environment, SqlState(number), converted);
+    std::memcpy(target, state.data(), state.size());
+}
+
+// Callers read texts of up to OCI_ERROR_MAXMSG_SIZE bytes: an engine's long message is cut, but still ends its line.
+std::string Message(const Environment& environment, const ErrorList::Record& record) {
+    const std::size_t longest = OCI_ERROR_MAXMSG_SIZE / (environment.Utf16() ? 2 : 1) - 1;
+    std::string message = ErrorMessage(record.number, record.engine, record.detail);
+    if (message.size() <= longest) return message;
+    std::size_t end = longest - 1;
+    while (end > 0 && (static_cast<unsigned char>(message[end]) & 0xC0) == 0x80) --end;
+    message.resize(end);
+    return message += '\n';
+}
+
+sword GetRecord(const Environment& environment, const ErrorList& list, ub4 recordno, OraText* sqlstate, sb4* code,
+                OraText* buf, ub4 bufsize) noexcept {
+    if (recordno == 0 || recordno > list.Records().size()) return OCI_NO_DATA;
+    const ErrorList::Record& record = list.Records()[recordno - 1];
+    if (code) *code = record.number;
+    try {
+        if (sqlstate) StoreState(environment, record.number, sqlstate);
+        if (!buf) return OCI_SUCCESS;
+        return TextToBuffer(environment, Message(environment, record), buf, bufsize) ? OCI_SUCCESS : OCI_ERROR;
+    } catch (const std::bad_alloc&) {
+        return OCI_ERROR;
+    }
+}
+
+}  // namespace
+
+sword OCIErrorGet(dvoid* hndl, ub4 recordno, OraText* sqlstate, sb4* code, OraText* buf, ub4 bufsize, ub4 type) {
+    if (type == OCI_HTYPE_ERROR) {
+        const ErrorHandle* error = Live<ErrorHandle>(hndl);
+        if (!error) return OCI_INVALID_HANDLE;
+        return GetRecord(error->Env(), error->list, recordno, sqlstate, code, buf, bufsize);
+    }
+    Environment* environment = type == OCI_HTYPE_ENV ? Live<Environment>(hndl) : nullptr;
+    if (!environment) return OCI_INVALID_HANDLE;
+    const std::lock_guard lock(environment->errors.mutex);
+    return GetRecord(*environment, environment->errors.list, recordno, sqlstate, code, buf, bufsize);
+}

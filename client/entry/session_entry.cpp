@@ -1,0 +1,283 @@
+// Connections and user sessions: logon, server attach, session begin, password change, versions, ping, break, reset.
+#include <cstring>
+#include <functional>
+#include <optional>
+#include <string>
+
+#include "handles/gate.h"
+#include "oci.h"
+#include "sessions/service_context.h"
+
+namespace {
+
+constexpr int kBadMode = 24300;
+constexpr int kLengthWithoutText = 24310;
+constexpr int kBadCredentials = 24323;
+constexpr int kAttachFirst = 24327;
+constexpr int kNoConnectionPool = 24392;
+constexpr int kNoSessionPool = 24416;
+constexpr int kProxyUnsupported = 24419;
+constexpr int kBadText = 24501;
+constexpr int kNoPassword = 1005;
+constexpr int kNoNewPassword = 988;
+constexpr int kBadLogon = 1017;
+constexpr int kNotLoggedOn = 1012;
+constexpr int kConnectNameTooLong = 12154;
+
+constexpr std::size_t kLongestText = 1024;    // bytes of a name, a password or a connect text
+constexpr ub4 kPasswordChangeLogsOn = OCI_AUTH;
+
+// An argument of text and length: UTF-8 text on success. What is too long answers `too_long`, unread.
+Status ReadText(const Environment& environment, const OraText* text, ub4 length, int too_long, std::string& utf8) {
+    if (!text || length == 0) return {};
+    if (length > kLongestText) return Error(too_long);
+    const TextIn in(environment, text, length);
+    if (!in.Valid()) return Error(kBadText);
+    utf8 = in.View();
+    return {};
+}
+
+Status ReadDatabase(const Environment& environment, const OraText* text, ub4 length, std::string& database) {
+    if (!text && length != 0) return Error(kLengthWithoutText);
+    Status status = ReadText(environment, text, length, kConnectNameTooLong, database);
+    database.resize(std::strlen(database.c_str()));    // a length beyond the end of the text
+    return status;
+}
+
+// Without a name and a password it is the operating-system user.
+Status CheckCredentials(engine::Credentials& credentials) {
+    credentials.external = credentials.user.empty() && credentials.password.empty();
+    if (credentials.external) return {};
+    if (credentials.user.empty()) return Error(kBadLogon);
+    return credentials.password.empty() ? Error(kNoPassword) : Status();
+}
+
+Status ReadCredentials(const Environment& environment, const OraText* user, ub4 user_length, const OraText* password,
+                       ub4 password_length, engine::Credentials& credentials) {
+    Status status = ReadText(environment, user, user_length, kBadLogon, credentials.user);
+    if (status.Ok()) status = ReadText(environment, password, password_length, kBadLogon, credentials.password);
+    return status.Ok() ? CheckCredentials(credentials) : status;
+}
+
+Status CheckLogonMode(ub4 mode) {
+    if (mode & OCI_LOGON2_CPOOL) return Error(kNoConnectionPool);
+    if (mode & OCI_LOGON2_SPOOL) return Error(kNoSessionPool);
+    if (mode & OCI_LOGON2_PROXY) return Error(kProxyUnsupported);
+    return mode & ~static_cast<ub4>(OCI_LOGON2_STMTCACHE) ? Error(kBadMode) : Status();
+}
+
+struct LogonTexts {
+    const OraText* user;
+    ub4 user_length;
+    const OraText* password;
+    ub4 password_length;
+    const OraText* database;
+    ub4 database_length;
+};
+
+// Logs on in the context that *out points to, or in a new one, which a failure takes away again.
+Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts, ub4 mode) {
+    if (!out) return Error(kNullArgument);
+    Status status = CheckLogonMode(mode);
+    if (status.Failed()) return status;
+    engine::Credentials credentials;
+    std::string database;
+    status = ReadCredentials(environment, texts.user, texts.user_length, texts.password, texts.password_length, credentials);
+    if (status.Ok()) status = ReadDatabase(environment, texts.database, texts.database_length, database);
+    if (status.Failed()) return status;
+
+    auto* service = Live<ServiceContext>(*out);
+    const bool is_new = !service;
+    if (is_new) service = Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0);
+    const SerialLock lock(service->Serial());
+    try {
+        status = service->LogOn(database, credentials);
+    } catch (...) {
+        if (is_new) Destroy(service);
+        throw;
+    }
+    if (status.Failed()) {
+        if (is_new) Destroy(service);
+        return status;
+    }
+    if (mode & OCI_LOGON2_STMTCACHE) service->statement_cache_size = ServiceContext::kDefaultCacheSize;
+    *out = AsHandle<OCISvcCtx>(service);
+    return status;
+}
+
+Status BeginSession(ServiceContext& service, Session& session, ub4 kind, ub4 mode) {
+    Server* server = service.GetServer();
+    if (!server || !server->Attached()) return Error(kAttachFirst);
+    engine::Credentials credentials{session.user, session.password, kind == OCI_CRED_EXT};
+    if (kind == OCI_CRED_PROXY) return Error(kProxyUnsupported);
+    if (kind != OCI_CRED_RDBMS && kind != OCI_CRED_EXT) return Error(kBadCredentials);
+    Status status = credentials.external ? Status() : CheckCredentials(credentials);
+    if (status.Ok()) status = session.Begin(*server, credentials);
+    if (status.Ok() && mode & OCI_STMT_CACHE && service.statement_cache_size == 0) {
+        service.statement_cache_size = ServiceContext::kDefaultCacheSize;
+    }
+    return status;
+}
+
+// Changes the password on a connection of its own, which the session then goes on with.
+Status ChangePasswordAndLogOn(ServiceContext& service, const std::string& user, const std::string& old_password,
+                              const std::string& new_password) {
+    Server* server = nullptr;
+    Status status = service.RequireServer(server);
+    if (status.Failed()) return status;
+    Session* set = service.GetSession();
+    Session& session = set ? *set : service.OwnSession();
+    if (session.Begun()) return session.GetLink()->Engine().ChangePassword(user, old_password, new_password);
+    std::unique_ptr<engine::Connection> connection;
+    status = server->TakeConnection(connection);
+    if (status.Ok()) status = connection->Authenticate({user, old_password, false});
+    if (status.Ok()) status = connection->ChangePassword(user, old_password, new_password);
+    if (status.Failed()) {
+        if (connection) server->GiveBack(std::move(connection));
+        return status;
+    }
+    session.user = user;
+    status = session.Adopt(*server, std::move(connection), user);
+    return status.Ok() ? service.SetSession(&session) : status;
+}
+
+struct PasswordTexts {
+    std::string user;
+    std::string old_password;
+    std::string new_password;
+};
+
+Status ChangePassword(ServiceContext& service, PasswordTexts& texts, ub4 mode) {
+    if (texts.new_password.empty()) return Error(kNoNewPassword);
+    if (mode & kPasswordChangeLogsOn) {
+        if (texts.user.empty()) return Error(kBadLogon);
+        return ChangePasswordAndLogOn(service, texts.user, texts.old_password, texts.new_password);
+    }
+    std::shared_ptr<Link> link;
+    Status status = service.Require(link);
+    if (status.Failed()) return status;
+    if (texts.user.empty()) texts.user = link->user;
+    if (texts.user.empty()) return Error(kBadLogon);
+    return link->Engine().ChangePassword(texts.user, texts.old_password, texts.new_password);
+}
+
+// The version text of the server that a service context or a server handle is attached to.
+Status VersionText(Object& object, std::string& text) {
+    Server* server = Live<Server>(&object);
+    if (auto* service = Live<ServiceContext>(&object)) {
+        Status status = service->RequireServer(server);
+        if (status.Failed()) return status;
+    }
+    if (!server->Attached()) return Error(3114);
+    text = server->Version();
+    return {};
+}
+
+// Calls on the links that a service context or a server handle has; needs at least an attached server. Takes no lock:
+// OCIBreak comes from another thread while a call holds it.
+sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
+    return EnterError(errhp, [&](ErrorHandle&) -> Status {
+        Server* server = Live<Server>(handle);
+        if (auto* service = Live<ServiceContext>(handle)) {
+            Session* session = service->GetSession();
+            if (session && session->Begun()) {
+                act(*session->GetLink());
+                return {};
+            }
+            return service->RequireServer(server);
+        }
+        if (!server) return InvalidHandle();
+        if (!server->Attached()) return Error(3114);
+        for (Session* session : server->Sessions()) act(*session->GetLink());
+        return {};
+    });
+}
+
+}  // namespace
+
+sword OCILogon(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw, ub4 pwLen,
+               const OraText* db, ub4 dbLen) {
+    return OCILogon2(env, err, svcOut, user, userLen, pw, pwLen, db, dbLen, OCI_DEFAULT);
+}
+
+sword OCILogon2(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw, ub4 pwLen,
+                const OraText* db, ub4 dbLen, ub4 mode) {
+    return Enter<Environment>(env, err, [&](Environment& environment) {
+        return LogOn(environment, svcOut, {user, userLen, pw, pwLen, db, dbLen}, mode);
+    });
+}
+
+sword OCILogoff(OCISvcCtx* svc, OCIError* err) {
+    return Enter<ServiceContext>(svc, err, [](ServiceContext& service) { return service.LogOff(); });
+}
+
+sword OCIServerAttach(OCIServer* srv, OCIError* err, const OraText* db, sb4 dbLen, ub4 mode) {
+    return Enter<Server>(srv, err, [&](Server& server) -> Status {
+        if (mode & OCI_CPOOL) return Error(kNoConnectionPool);
+        if (mode != OCI_DEFAULT) return Error(kBadMode);
+        if (dbLen < 0) return Error(kNullArgument);
+        std::string database;
+        Status status = ReadDatabase(server.Env(), db, static_cast<ub4>(dbLen), database);
+        return status.Ok() ? server.Attach(database) : status;
+    });
+}
+
+// The mode is not looked at: applications pass modes of environments here.
+sword OCIServerDetach(OCIServer* srv, OCIError* err, ub4) {
+    return Enter<Server>(srv, err, [](Server& server) { return server.Detach(); });
+}
+
+sword OCISessionBegin(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4 credentials, ub4 mode) {
+    return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
+        auto* session = Live<Session>(ses);
+        return session ? BeginSession(service, *session, credentials, mode) : InvalidHandle();
+    });
+}
+
+sword OCISessionEnd(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4) {
+    return Enter<ServiceContext>(svc, err, [&](ServiceContext&) {
+        auto* session = Live<Session>(ses);
+        if (!session) return InvalidHandle();
+        return session->Begun() ? session->End() : Error(kNotLoggedOn);
+    });
+}
+
+sword OCIPasswordChange(OCISvcCtx* svc, OCIError* err, const OraText* user, ub4 userLen, const OraText* oldPw, ub4 oldLen,
+                        const OraText* newPw, sb4 newLen, ub4 mode) {
+    return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
+        PasswordTexts texts;
+        const Environment& environment = service.Env();
+        Status status = ReadText(environment, user, userLen, kBadLogon, texts.user);
+        if (status.Ok()) status = ReadText(environment, oldPw, oldLen, kBadLogon, texts.old_password);
+        if (status.Ok()) status = ReadText(environment, newPw, static_cast<ub4>(newLen), kNoNewPassword, texts.new_password);
+        return status.Ok() ? ChangePassword(service, texts, mode) : status;
+    });
+}
+
+sword OCIServerVersion(dvoid* hndl, OCIError* err, OraText* buf, ub4 bufsize, ub1 type) {
+    return Enter<Object>(hndl, err, [&](Object& object) -> Status {
+        if (object.Type() != type || (type != OCI_HTYPE_SVCCTX && type != OCI_HTYPE_SERVER)) return InvalidHandle();
+        if (!buf || bufsize == 0) return Error(kNullArgument);
+        std::string text;
+        Status status = VersionText(object, text);
+        if (status.Ok()) TextToBuffer(object.Env(), text, buf, bufsize);    // cut to what fits
+        return status;
+    });
+}
+
+sword OCIPing(OCISvcCtx* svc, OCIError* err, ub4) {
+    return Enter<ServiceContext>(svc, err, [](ServiceContext& service) {
+        std::shared_ptr<Link> link;
+        Status status = service.Require(link);
+        return status.Ok() ? link->Engine().Ping() : status;
+    });
+}
+
+sword OCIBreak(dvoid* svcOrServer, OCIError* err) {
+    return EnterLinks(svcOrServer, err, [](Link& link) { link.Cancel(); });
+}
+
+// Nothing is left over from a break: the call that it stopped has told, or none was running.
+sword OCIReset(dvoid* svcOrServer, OCIError* err) {
+    return EnterLinks(svcOrServer, err, [](Link&) {});
+}
