@@ -1,6 +1,8 @@
 // Symbolic words and their values, and the reading of plain numbers.
 #pragma once
 
+#include <string_view>
+
 #include "core/keyword_tables.h"
 
 // The value of the first row whose keyword the word begins (case ignored), or kNotFound. A null or empty word prints
@@ -20,7 +22,11 @@ int DecodeBitmaskOrNumber(const char* word, const KeywordTable* table);
 int DecodeNumber(const char* word);
 long DecodeLong(const char* word);
 
-// The reserved words, compared over the whole word without regard to case. A null pointer is neither.
-bool IsNull(const char* word);
-bool IsInvalid(const char* word);
-bool SameIgnoringCase(const char* left, const char* right);
+// The reserved words, compared over the whole word without regard to case.
+bool SameIgnoringCase(std::string_view left, std::string_view right);
+inline bool IsNull(std::string_view word) {
+    return SameIgnoringCase(word, "null");
+}
+inline bool IsInvalid(std::string_view word) {
+    return SameIgnoringCase(word, "invalid");
+}

@@ -1,1 +1,50 @@
-int main() { return 0; }
+// The entry: start-up, the loop over standard input, the exit.
+#include <cstring>
+
+#include "core/messages.h"
+#include "core/script.h"
+#include "core/state.h"
+#include "objects/library_failure.h"
+#include "platform/client_library.h"
+#include "platform/code_page.h"
+#include "report/return_code.h"
+
+namespace {
+
+constexpr const char* kBanner[] = {
+    "harnix - an interactive driver for client libraries of the OCI call interface",
+    "",
+    "Commands are read from standard input, one a line; `read FileName` runs a script.",
+    "The log is written to standard output.",
+    "Free for use, study and change. There is no warranty of any kind.",
+    "",
+};
+
+void FetchCodePages() {
+    const int rc = GetProcessCodePage(&application_code_page, &second_code_page);
+    if (rc != 0) Message(kError, "%s failed with rc - %ld\n", "GetProcessCodePage", static_cast<long>(rc));
+}
+
+// `harnix password` or `harnix -passwd password`. A lone "-passwd" is a password; anything else is ignored.
+void TakePassword(int count, char** arguments) {
+    const char* password = nullptr;
+    if (count == 2) password = arguments[1];
+    else if (count > 2 && std::strcmp(arguments[1], "-passwd") == 0) password = arguments[2];
+    if (password == nullptr) return;
+    start_up_password = password;
+    password_given = true;
+}
+
+}  // namespace
+
+int main(int count, char** arguments) {
+    PrepareMessages();
+    SetLoaderComplaint([](const char* text) { MessageText(kError, text); });
+    report_library_failure = ReturnCodeReport;
+    FetchCodePages();
+    TakePassword(count, arguments);
+    for (const char* line : kBanner) Message(kOutput, "%s\n", line);
+    ReadAndEvaluateScript(stdin);
+    Message(kOutput, "\n");
+    return 0;
+}

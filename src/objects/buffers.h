@@ -3,8 +3,13 @@
 // are the buffer's own; the pointers "for calls" are what commands pass on, and a script may set them to null.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <span>
+
+// What a data block has behind its last element, so that a value of any fixed size may be read or written at any element
+// even after a script has changed the type.
+inline constexpr size_t kElementSlack = 64;
 
 struct MemBuffer {
     bool in_use;
@@ -35,6 +40,8 @@ struct MemBuffer {
     uint32_t dynamic_count;
 
     unsigned char* Element(uint32_t index) const { return data + size_t{index} * element_size; }
+    // False when an allocation has failed half-way: elements must not be touched then.
+    bool Complete() const { return data && indicators && lengths && return_codes; }
 };
 
 std::span<MemBuffer> Buffers();

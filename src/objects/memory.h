@@ -3,10 +3,9 @@
 
 #include <cstddef>
 #include <memory>
-#include <source_location>
 
 // A zero-filled block of at least one byte. Failure prints "GetMem: failed to allocate memory.\n" and gives null.
-void* GetMem(size_t size, std::source_location where = std::source_location::current());
+void* GetMem(size_t size, int line = __builtin_LINE());
 void FreeMem(void* block);
 
 struct FreeMemory {

@@ -26,7 +26,6 @@ const KindInfo& InfoOf(Kind kind);
 
 struct NamedObject {
     bool in_use;            // release clears this and nothing else
-    uint8_t name_width;
     uint16_t lob_type;      // lob: the external type, such as 112
     uint32_t lob_flag;      // lob
     uint32_t array_count;   // descriptors: elements of the array, 0 for a single descriptor
@@ -68,10 +67,15 @@ struct DescriptorReference {
 };
 DescriptorReference ResolveDescriptor(Kind kind, const char* name);
 
+// The same without messages and reserved words; false when there is no such object.
+bool FindObject(Kind kind, const char* name, void*& object);
+
 // The first occupied slot of that name, or null. Prints nothing and knows no reserved words.
 NamedObject* FindByName(Kind kind, const char* name);
 // The first occupied slot of that pointer, or null.
 NamedObject* FindByPointer(Kind kind, const void* object);
+// All slots of the kind, free ones included; none for kinds with records of their own.
+std::span<NamedObject> SlotsOf(Kind kind);
 
 // --- Making and freeing -----------------------------------------------------------------------------------------------
 

@@ -7,10 +7,15 @@
 #include <string_view>
 #include <vector>
 
+#include "core/messages.h"
+
 // Converts a text argument. Returns 0 (or a tolerated warning of the code-page service), -1 for a bad argument, else the
 // service's code; says so by its messages. Lengths and capacity in bytes. A word W'...' is copied, not converted.
 int convertToUTF16(const char* input, uint32_t input_length, char* output, uint32_t capacity, uint32_t* output_length,
                    bool quiet = false);
+
+// Whether a result of convertToUTF16 counts as success: 0, or one of the service's warnings (truncated, substituted).
+bool IsTolerated(int result);
 
 // A UTF-16 text of the library as the application code page shows it. False after a failure, which has been printed.
 bool convertFromUTF16(const void* text, size_t length, std::string& output);
@@ -18,10 +23,11 @@ bool convertFromUTF16(const void* text, size_t length, std::string& output);
 // The bytes of a UTF-16 text before its first zero pair, looking no further than `limit` bytes.
 size_t Utf16Length(const void* text, size_t limit);
 
-// Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". False after a failed
-// conversion, which has been printed after what the line held.
-class Line;
+// Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". After a failed conversion the
+// line is printed as far as it goes, the failure after it, and false returned.
 bool AddText(Line& line, const void* text, size_t length, bool utf16);
+// The same with quotes around a text that is not UTF-16, too.
+bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16);
 
 // How large the area for the UTF-16 form of an argument is.
 enum class TextArea {

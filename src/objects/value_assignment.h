@@ -3,7 +3,7 @@
 
 #include <cstdint>
 
-// An element to be filled. The pointers may be null where the element has no such field.
+// An element to be filled.
 struct ElementTarget {
     int type;
     unsigned char* data;
@@ -15,6 +15,7 @@ struct ElementTarget {
     int16_t scale;
 };
 
-// Stores `length` bytes of the text (never past the end of the element). "null" sets the indicator only. False when the
-// text cannot be read as the type: "Invalid value - %s\n" has been printed and the element is as it was.
-bool AssignText(const ElementTarget& target, const char* text, long length);
+// Stores `length` bytes of the word, never past the end of the element; zeros stand in for what the word lacks. "null"
+// sets the indicator to -1 and the length to 0. False when the word cannot be read as the type:
+// "Invalid value - %s\n" has been printed and the element is as it was.
+bool AssignText(const ElementTarget& target, const char* word, long length);

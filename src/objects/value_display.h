@@ -6,9 +6,7 @@
 
 #include "core/messages.h"
 #include "objects/buffers.h"
-
-struct OCIDate;
-struct OCIDateTime;
+#include "oci.h"
 
 // One element, wherever it lies.
 struct ElementView {
@@ -26,8 +24,9 @@ struct ElementView {
 // Ends the line, which holds the element's prefix, with the value if one follows, and prints it.
 void DisplayElement(Line& line, const ElementView& element);
 
-// All elements of a buffer, "Row=%ld,Ind=%ld,rcode=%ld,len=%ld,data=" before each.
-void DisplayBuffer(const MemBuffer& buffer);
+// All elements of a buffer, "Row=%ld,Ind=%ld,rcode=%ld,len=%ld,data=" before each. What the line already holds stands
+// before the first.
+void DisplayBuffer(Line& line, const MemBuffer& buffer);
 
 // Whether the statement's character data is UTF-16, by its registry slot.
 bool StatementIsUtf16(const void* statement);

@@ -1,0 +1,46 @@
+#include "core/dispatch.h"
+
+#include "commands/families.h"
+#include "core/messages.h"
+#include "core/script.h"
+
+namespace {
+
+constexpr int kExitCode = 76;
+
+constexpr PlainCommand kLoopCommands[] = {
+    {{77, kAnyWords, "read FileName"}, ReadScript},
+};
+
+HandlerTable AllHandlers() {
+    HandlerTable handlers;
+    handlers.Add(kLoopCommands);
+    for (const auto add : kCommandFamilies) add(handlers);
+    return handlers;
+}
+
+void Run(int code, int count, char** words) {
+    const HandlerTable::Handler* handler = Handlers().Find(code);
+    if (handler == nullptr) return Message(kError, "ReadAndEvaluateScript(): %s", "Case error !\n");
+    if (!handler->row->words.Has(count)) return InvalidSyntax(handler->row->usage);
+    handler->run(*handler->row, count, words);
+}
+
+}  // namespace
+
+const HandlerTable& Handlers() {
+    static const HandlerTable kHandlers = AllHandlers();
+    return kHandlers;
+}
+
+int Dispatch(int count, char** words) {
+    if (words[0][0] == '\0') Message(kError, "DecodeKeyword(): Null length token.\n");
+    const Command* command = FindCommand(words[0]);
+    if (command == nullptr) {
+        Message(kError, "Syntax Error: %s !\n", "First token is not a valid command");
+        return 0;
+    }
+    if (command->code == kExitCode) return kStopLoop;
+    Run(command->code, count, words);
+    return 0;
+}

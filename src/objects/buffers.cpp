@@ -1,0 +1,145 @@
+#include "objects/buffers.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "core/keywords.h"
+#include "core/messages.h"
+#include "objects/library_number.h"
+#include "objects/memory.h"
+#include "objects/registry.h"
+#include "oci.h"
+#include "platform/packed_decimal.h"
+
+namespace {
+
+MemBuffer buffers[256];
+
+constexpr char kZeroText[] = "0.0";
+
+// At least one element and one byte, so that commands may always touch the first element.
+size_t BlockSize(size_t element_size, size_t array_size) {
+    return std::max<size_t>(element_size, 1) * std::max<size_t>(array_size, 1);
+}
+
+template <class T> bool Obtain(T*& block, size_t size, const char* complaint) {
+    block = static_cast<T*>(GetMem(size));
+    if (block == nullptr) MessageText(kError, complaint);
+    return block != nullptr;
+}
+
+bool ObtainBlocks(MemBuffer& buffer) {
+    const size_t halves = BlockSize(sizeof(uint16_t), buffer.array_size);
+    return Obtain(buffer.data, BlockSize(buffer.element_size, buffer.array_size) + kElementSlack,
+                  "Could not allocate memory for buffer\n") &&
+           Obtain(buffer.indicators, halves, "Could not allocate memory for null indicator\n") &&
+           Obtain(buffer.lengths, halves, "Could not allocate memory for length value\n") &&
+           Obtain(buffer.return_codes, halves, "Could not allocate memory for length rcode\n");
+}
+
+// Number buffers start as zeros of their type; the first that cannot be made ends it.
+bool SetZero(const MemBuffer& buffer, unsigned char* element) {
+    if (buffer.type == SQLT_PDN)
+        return TextToDecimal(kZeroText, element, buffer.precision, buffer.scale) == 0;
+    OCINumber zero;
+    if (NumberFromText(kZeroText, zero) != OCI_SUCCESS) return false;
+    std::copy_n(zero.OCINumberPart, sizeof zero, element);
+    return true;
+}
+
+void InitialiseNumbers(const MemBuffer& buffer) {
+    if (buffer.type != SQLT_NUM && buffer.type != SQLT_VNU && buffer.type != SQLT_PDN) return;
+    for (uint32_t index = 0; index < buffer.array_size; ++index)
+        if (!SetZero(buffer, buffer.Element(index))) return;
+}
+
+template <class T> void FreeBlock(T*& block) {
+    FreeMem(std::exchange(block, nullptr));
+}
+
+}  // namespace
+
+std::span<MemBuffer> Buffers() {
+    return buffers;
+}
+
+MemBuffer* FindBufferQuietly(const char* name) {
+    return FindSlot(Buffers(), name);
+}
+
+MemBuffer* FindBuffer(const char* name) {
+    MemBuffer* buffer = FindBufferQuietly(name);
+    if (buffer == nullptr && !IsNull(name)) Message(kError, "Buffer %s not found\n", name);
+    return buffer;
+}
+
+bool HoldsPointers(int type) {
+    constexpr int kTypes[] = {SQLT_LVB, SQLT_CUR, SQLT_CLOB, SQLT_BLOB, SQLT_RSET, SQLT_VST,
+                              SQLT_DATE, SQLT_TIMESTAMP, SQLT_TIMESTAMP_TZ, SQLT_TIMESTAMP_LTZ};
+    return std::ranges::find(kTypes, type) != std::end(kTypes);
+}
+
+uint32_t ElementSize(int type, uint32_t given, uint32_t precision) {
+    switch (type) {
+        case SQLT_NUM:
+        case SQLT_VNU: return 22;
+        case SQLT_INT: return given == 1 || given == 2 || given == 4 || given == 8 ? given : 4;
+        case SQLT_FLT: return given == 4 || given == 8 || given == 16 ? given : 8;
+        case SQLT_PDN: return precision / 2 + 1;
+        case SQLT_VCS:
+        case SQLT_VBI:
+        case SQLT_AVC: return given + 2;
+        case SQLT_LVC: return given + 4;
+        case SQLT_RID: return 10;
+        case SQLT_DAT: return 7;
+        case SQLT_BFLOAT:
+        case SQLT_RDD:
+        case SQLT_ODT: return 8;
+        case SQLT_BDOUBLE: return 16;
+        default: return HoldsPointers(type) ? 8 : given;
+    }
+}
+
+int AllocateBuffer(MemBuffer& buffer, void* statement, uint32_t element_size, uint32_t array_size, int type,
+                   uint16_t precision, int16_t scale) {
+    buffer.statement = statement;
+    buffer.data = nullptr;
+    buffer.call_data = nullptr;
+    buffer.element_size = buffer.call_length = buffer.created_size = element_size;
+    buffer.created_type = buffer.type = static_cast<uint16_t>(type);
+    buffer.precision = precision;
+    buffer.scale = scale;
+    buffer.indicators = buffer.call_indicators = nullptr;
+    buffer.lengths = buffer.call_lengths = nullptr;
+    buffer.return_codes = buffer.call_return_codes = nullptr;
+    buffer.array_size = array_size;
+    buffer.previous_lengths = buffer.piece_lengths = nullptr;
+    buffer.dynamic_lengths = 0;
+    buffer.holds_pointers = false;
+    buffer.current_element = 0;
+    buffer.dynamic_list = nullptr;
+    buffer.dynamic_count = 0;
+    if (!ObtainBlocks(buffer)) return -1;
+    buffer.call_data = buffer.data;
+    buffer.call_indicators = buffer.indicators;
+    buffer.call_lengths = buffer.lengths;
+    buffer.call_return_codes = buffer.return_codes;
+    InitialiseNumbers(buffer);
+    buffer.holds_pointers = HoldsPointers(type);
+    return 0;
+}
+
+void FreeBufferBlocks(MemBuffer& buffer) {
+    FreeBlock(buffer.data);
+    FreeBlock(buffer.indicators);
+    FreeBlock(buffer.lengths);
+    FreeBlock(buffer.return_codes);
+    FreeBlock(buffer.previous_lengths);
+    FreeBlock(buffer.piece_lengths);
+    FreeBlock(buffer.dynamic_list);
+    buffer.dynamic_count = 0;
+    buffer.call_data = nullptr;
+    buffer.call_indicators = nullptr;
+    buffer.call_lengths = nullptr;
+    buffer.call_return_codes = nullptr;
+}

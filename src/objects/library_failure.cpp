@@ -1,0 +1,3 @@
+#include "objects/library_failure.h"
+
+void (*report_library_failure)(void* error_handle, int rc) = [](void*, int) {};

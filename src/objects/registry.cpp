@@ -1,0 +1,222 @@
+#include "objects/registry.h"
+
+#include <algorithm>
+#include <array>
+#include <iterator>
+#include <string_view>
+
+#include "core/keywords.h"
+#include "core/messages.h"
+
+namespace {
+
+constexpr int kWide = 36;
+constexpr int kNarrow = 32;
+
+// In the order of Kind. Some texts are shared by kinds that are not alike: logs have them so.
+constexpr KindInfo kKinds[] = {
+    {30, kNarrow, "Reached max environment handle count - %ld\n", "*** Environment handle already in use\n"},
+    {30, kNarrow, "Reached max error handle count - %ld\n", "*** Error handle already in use\n"},
+    {800, kNarrow, "Reached max svc handle count - %ld\n", "*** Svc handle already in use\n"},
+    {800, kNarrow, "Reached max server handle count - %ld\n", "*** Server handle already in use\n"},
+    {800, kNarrow, "Reached max session handle count - %ld\n", "*** Session handle already in use\n"},
+    {800, kNarrow, "Reached max trans handle count - %ld\n", "*** Trans handle already in use\n"},
+    {800, kWide, "Reached max spool handle count - %ld\n", "*** SPool handle already in use\n"},
+    {800, kWide, "Reached max cpool handle count - %ld\n", "*** SPool handle already in use\n"},
+    {650, kNarrow, "Reached max stmt handle count - %ld\n", "*** Stmt handle already in use\n"},
+    {650, kNarrow, "Reached max describe handle count - %ld\n", "*** Describe handle already in use\n"},
+    {256, kNarrow, "Reached max bind handle count - %ld\n", "*** Bind handle already in use\n"},
+    {256, kNarrow, "Reached max define handle count - %ld\n", "*** Define handle already in use\n"},
+    {100, kNarrow, "Reached max param handle count - %ld\n", nullptr},
+    {650, kNarrow, "Reached max lob handle count - %ld\n", "*** Lob handle already in use\n"},
+    {650, kNarrow, "Reached max lob handle count - %ld\n", "*** Result handle already in use\n"},
+    {650, kNarrow, "Reached max rowid handle count - %ld\n", "*** Rowid handle already in use\n"},
+    {650, kNarrow, "Reached max file handle count - %ld\n", "*** File handle already in use\n"},
+    {650, kNarrow, "Reached max datetime handle count - %ld\n", "*** Datetime handle already in use\n"},
+    {650, kNarrow, "Reached max string handle count - %ld\n", nullptr},
+    {650, kNarrow, "Reached max raw handle count - %ld\n", nullptr},
+    {650, kNarrow, "Reached max mutex handle count - %ld\n", "*** Mutex handle already in use\n"},
+    {650, kNarrow, "Reached max key handle count - %ld\n", "*** Key handle already in use\n"},
+    {650, kNarrow, "Reached max tid handle count - %ld\n", "*** tid handle already in use\n"},
+    {650, kNarrow, "Reached max thnd handle count - %ld\n", "*** thnd handle already in use\n"},
+    {256, kWide, "Reached max buffer handle count - %ld\n", nullptr},
+    {256, kWide, "Reached max struct handle count - %ld\n", "Name already in use %s\n"},
+    {30, kNarrow, "Reached max cursor count - %ld\n", nullptr},
+    {30, kNarrow, "Reached max ldainfo count - %ld\n", "lda already in use\n"},
+};
+static_assert(std::size(kKinds) == static_cast<size_t>(Kind::ldainfo) + 1);
+
+constexpr size_t kHandleKinds = static_cast<size_t>(Kind::thnd) + 1;  // those whose slots are NamedObjects
+constexpr int kKeyAreaSize = 80;
+
+// Where each kind's slots begin in the one array that holds them all.
+constexpr auto kFirstSlot = [] {
+    std::array<int, kHandleKinds + 1> first{};
+    for (size_t kind = 0; kind < kHandleKinds; ++kind) first[kind + 1] = first[kind] + kKinds[kind].capacity;
+    return first;
+}();
+
+NamedObject all_slots[kFirstSlot[kHandleKinds]];
+unsigned char key_areas[kKinds[static_cast<size_t>(Kind::key)].capacity][kKeyAreaSize];
+
+bool IsDescriptor(Kind kind) {
+    return kind >= Kind::lob && kind <= Kind::datetime;
+}
+
+NamedObject* FindByName(Kind kind, std::string_view name) {
+    name = name.substr(0, static_cast<size_t>(InfoOf(kind).name_width) - 1);
+    for (NamedObject& slot : SlotsOf(kind))
+        if (slot.in_use && name == slot.name) return &slot;
+    return nullptr;
+}
+
+void ComplainNotFound(std::string_view name) {
+    Message(kError, "Handle %.*s not found\n", static_cast<int>(name.size()), name.data());
+}
+
+}  // namespace
+
+const KindInfo& InfoOf(Kind kind) {
+    return kKinds[static_cast<size_t>(kind)];
+}
+
+std::span<NamedObject> SlotsOf(Kind kind) {
+    const auto index = static_cast<size_t>(kind);
+    if (index >= kHandleKinds) return {};
+    return std::span(all_slots).subspan(static_cast<size_t>(kFirstSlot[index]),
+                                        static_cast<size_t>(kKinds[index].capacity));
+}
+
+void* InvalidObject() {
+    static char area[15] = "Invalid buffer";
+    return area;
+}
+
+NamedObject* FindByName(Kind kind, const char* name) {
+    return FindByName(kind, std::string_view(name));
+}
+
+NamedObject* FindByPointer(Kind kind, const void* object) {
+    for (NamedObject& slot : SlotsOf(kind))
+        if (slot.in_use && slot.object == object) return &slot;
+    return nullptr;
+}
+
+// The part of a word that names an object: for descriptors, what stands before an index.
+std::string_view NameIn(Kind kind, std::string_view word) {
+    return IsDescriptor(kind) ? word.substr(0, word.find('[')) : word;
+}
+
+// What the word finds in the table, its index obeyed. An index beyond the array, or none, gives the array itself.
+DescriptorReference LookUp(Kind kind, const char* word) {
+    DescriptorReference found;
+    const std::string_view name = NameIn(kind, word);
+    const bool indexed = word[name.size()] != '\0';
+    if (indexed) found.index = DecodeLong(word + name.size() + 1);
+    found.slot = FindByName(kind, name);
+    if (found.slot == nullptr) return found;
+    found.object = found.slot->object;
+    found.is_array = found.slot->array_count != 0;
+    if (found.is_array && indexed && found.index >= 0 && found.index < long{found.slot->array_count}) {
+        found.object = static_cast<void**>(found.object)[found.index];
+        found.is_array = false;
+    }
+    return found;
+}
+
+DescriptorReference ResolveDescriptor(Kind kind, const char* word) {
+    if (IsInvalid(word)) return {.object = InvalidObject()};
+    const DescriptorReference found = LookUp(kind, word);
+    const std::string_view name = NameIn(kind, word);
+    if (found.slot == nullptr && !IsNull(name)) ComplainNotFound(name);
+    return found;
+}
+
+void* ResolveObject(Kind kind, const char* name) {
+    return ResolveDescriptor(kind, name).object;
+}
+
+bool FindObject(Kind kind, const char* name, void*& object) {
+    const DescriptorReference found = LookUp(kind, name);
+    object = found.object;
+    return found.slot != nullptr;
+}
+
+void* ResolveErrorObject(const char* name) {
+    if (IsInvalid(name)) return InvalidObject();
+    if (const NamedObject* slot = FindByName(Kind::error, name)) return slot->object;
+    for (size_t kind = 0; kind < kHandleKinds; ++kind)
+        if (const NamedObject* slot = FindByName(static_cast<Kind>(kind), name)) return slot->object;
+    if (!IsNull(name)) ComplainNotFound(name);
+    return nullptr;
+}
+
+const char* OutputName(const char* word) {
+    return std::strcmp(word, "-1") == 0 || IsNull(word) ? nullptr : word;
+}
+
+bool CheckInUse(Kind kind, const char* name) {
+    if (FindByName(kind, name) == nullptr) return false;
+    if (InfoOf(kind).in_use != nullptr) MessageText(kError, InfoOf(kind).in_use);
+    return true;
+}
+
+void ReportOverflow(Kind kind) {
+    // Every overflow text holds one %ld and nothing else to fill.
+    Message(kError, InfoOf(kind).overflow, static_cast<long>(InfoOf(kind).capacity));
+}
+
+NamedObject* Register(Kind kind, const char* name, void* object, void* parent) {
+    if (IsNull(name) || IsInvalid(name)) {
+        Message(kError, "Variable name NULL not allowed\n");
+        return nullptr;
+    }
+    const std::span<NamedObject> slots = SlotsOf(kind);
+    const auto slot = std::ranges::find(slots, false, &NamedObject::in_use);
+    if (slot == slots.end()) {
+        ReportOverflow(kind);
+        return nullptr;
+    }
+    *slot = NamedObject{};
+    slot->in_use = true;
+    slot->object = object;
+    slot->parent = parent;
+    std::strncpy(slot->name, name, static_cast<size_t>(InfoOf(kind).name_width) - 1);
+    if (kind == Kind::key) slot->area = key_areas[slot - slots.begin()];
+    return &*slot;
+}
+
+void Release(Kind kind, const char* name) {
+    NamedObject* slot = FindByName(kind, name);
+    if (slot == nullptr) return ComplainNotFound(name);
+    slot->in_use = false;
+}
+
+std::optional<Kind> KindOfHandleType(int type) {
+    switch (type) {
+        case 1: return Kind::environment;
+        case 2: return Kind::error;
+        case 3: return Kind::svc;
+        case 4: return Kind::stmt;
+        case 5: return Kind::bind;
+        case 6: return Kind::define;
+        case 7: return Kind::describe;
+        case 8: return Kind::server;
+        case 9: return Kind::session;
+        case 10: return Kind::trans;
+        case 26: return Kind::cpool;
+        case 27: return Kind::spool;
+        default: return std::nullopt;
+    }
+}
+
+std::optional<Kind> KindOfDescriptorType(int type) {
+    switch (type) {
+        case 50: return Kind::lob;
+        case 52: return Kind::result;
+        case 54: return Kind::rowid;
+        case 56: return Kind::file;
+        case 62: return Kind::datetime;
+        default: return std::nullopt;
+    }
+}
