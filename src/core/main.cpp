@@ -12,12 +12,12 @@
 namespace {
 
 constexpr const char* kBanner[] = {
-    "harnix - an interactive driver for client libraries of the OCI call interface",
-    "",
-    "Commands are read from standard input, one a line; `read FileName` runs a script.",
-    "The log is written to standard output.",
-    "Free for use, study and change. There is no warranty of any kind.",
-    "",
+    "harnix - interactive test driver for client libraries of the OCI call interface",
+    "Copyright (c) the authors of harnix.",
+    "All rights that are not granted in writing are reserved.",
+    "The program is provided as it is, without warranty of any kind, express or",
+    "implied; its authors are not liable for damage that arises from its use.",
+    "All product names are the property of their respective owners.",
 };
 
 void FetchCodePages() {

@@ -1,13 +1,13 @@
-// Texts between the application code page and UTF-16.
+// Texts between the application code page and UTF-16, and the text arguments of commands.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "core/messages.h"
+#include "objects/memory.h"
 
 // Converts a text argument. Returns 0 (or a tolerated warning of the code-page service), -1 for a bad argument, else the
 // service's code; says so by its messages. Lengths and capacity in bytes. A word W'...' is copied, not converted.
@@ -40,6 +40,7 @@ enum class TextArea {
 // word is followed by zeros), unless the length is beyond kReadableText, where only the library can say no.
 class TextArgument {
 public:
+    static constexpr uint32_t kTokenBufferSize = 10000;  // what may be read at a word, whatever its length
     static constexpr uint32_t kReadableText = 256u << 20;
 
     // Texts beside "null" that stand for a null pointer are for the caller to say: pass a null word then. False when the
@@ -50,9 +51,11 @@ public:
     uint32_t Length() const { return length_; }
 
 private:
+    bool Pass(const char* word);
+    bool Pad(const char* word, const char*& padded);
     bool Convert(const char* word, uint32_t length, TextArea area);
     unsigned char* text_ = nullptr;
     uint32_t length_ = 0;
-    std::vector<char> padded_;
-    std::vector<char> converted_;
+    Memory<char> padded_;
+    Memory<char> converted_;
 };

@@ -1,0 +1,182 @@
+#include "objects/text_conversion.h"
+
+#include <algorithm>
+#include <cstring>
+
+#include "core/keywords.h"
+#include "core/state.h"
+#include "objects/memory.h"
+#include "platform/code_page.h"
+
+namespace {
+
+constexpr uint32_t kUtf16 = 1202;
+constexpr uint32_t kUtf8 = 1208;
+constexpr uint32_t kUcs2 = 13488;
+
+// The service's warnings that count as success.
+constexpr int kTruncated = static_cast<int>(0x870F00C0);
+constexpr int kSubstituted = static_cast<int>(0x870F00BC);
+
+uint32_t EffectiveCodePage() {
+    const bool unicode = application_code_page == kUtf8 || application_code_page == kUcs2;
+    return unicode ? second_code_page : application_code_page;
+}
+
+void SayConverted(uint32_t input_length, uint32_t output_length) {
+    Message(kOutput, "convertToUTF16 succeeded - In length - %ld, Out length - %ld\n", static_cast<long>(input_length),
+            static_cast<long>(output_length));
+}
+
+// A word W'...' stands for the bytes between its quotes.
+bool IsUtf16Literal(const char* input, uint32_t length) {
+    return length >= 3 && input[0] == 'W' && input[1] == '\'' && input[length - 1] == '\'';
+}
+
+// Converts without a message. Room for every code page: the largest takes four bytes for a UTF-16 unit of two.
+int FromUtf16(const void* text, size_t length, std::string& output) {
+    output.clear();
+    if (text == nullptr || length == 0) return 0;
+    output.resize(2 * length + 1);
+    size_t unused = 0;
+    const int rc = CodePageConvert(kUtf16, EffectiveCodePage(), text, length, nullptr, output.data(), output.size(),
+                                   &unused);
+    output.resize(IsTolerated(rc) ? output.size() - std::min(unused, output.size()) : 0);
+    return rc;
+}
+
+void SayNotConverted(int rc) {
+    Message(kError, "convertFromUTF16 failed: rc = %ld\n", static_cast<long>(rc));
+}
+
+bool AddConverted(Line& line, const void* text, size_t length) {
+    std::string converted;
+    const int rc = FromUtf16(text, length, converted);
+    if (!IsTolerated(rc)) {
+        line.Print();
+        SayNotConverted(rc);
+        return false;
+    }
+    line.Text("W\"").Text(converted).Character('"');
+    return true;
+}
+
+std::string_view Bytes(const void* text, size_t length) {
+    return text == nullptr ? std::string_view() : std::string_view(static_cast<const char*>(text), length);
+}
+
+}  // namespace
+
+bool IsTolerated(int result) {
+    return result == 0 || result == kTruncated || result == kSubstituted;
+}
+
+int convertToUTF16(const char* input, uint32_t input_length, char* output, uint32_t capacity, uint32_t* output_length,
+                   bool quiet) {
+    constexpr int kBadArgument = -1;
+    *output_length = 0;
+    const char* complaint = output == nullptr  ? "pOut is NULL\n"
+                            : input == nullptr ? "pIn is NULL\n"
+                            : capacity == 0    ? "cbOutLen is zero\n"
+                                               : nullptr;
+    if (complaint != nullptr) {
+        MessageText(kError, complaint);
+        return kBadArgument;
+    }
+    if (input_length == 0) {
+        std::memset(output, 0, capacity);
+        return 0;
+    }
+    if (IsUtf16Literal(input, input_length)) {
+        *output_length = std::min(input_length - 3, capacity);
+        std::memcpy(output, input + 2, *output_length);
+        SayConverted(input_length, *output_length);
+        return 0;
+    }
+    size_t unused = 0;
+    const int rc = CodePageConvert(EffectiveCodePage(), kUtf16, input, input_length, nullptr, output, capacity, &unused);
+    if (!IsTolerated(rc)) {
+        Message(kError, "CodePageConvert failed with rc - %ld\n", static_cast<long>(rc));
+        return rc;
+    }
+    *output_length = static_cast<uint32_t>(capacity - std::min<size_t>(unused, capacity));
+    if (!quiet) SayConverted(input_length, *output_length);
+    return rc;
+}
+
+bool convertFromUTF16(const void* text, size_t length, std::string& output) {
+    const int rc = FromUtf16(text, length, output);
+    if (IsTolerated(rc)) return true;
+    SayNotConverted(rc);
+    return false;
+}
+
+size_t Utf16Length(const void* text, size_t limit) {
+    const auto* bytes = static_cast<const char*>(text);
+    size_t length = 0;
+    while (length + 1 < limit && (bytes[length] != 0 || bytes[length + 1] != 0)) length += 2;
+    return length;
+}
+
+bool AddText(Line& line, const void* text, size_t length, bool utf16) {
+    if (utf16) return AddConverted(line, text, length);
+    line.Text(Bytes(text, length));
+    return true;
+}
+
+bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16) {
+    if (utf16) return AddConverted(line, text, length);
+    line.Character('"').Text(Bytes(text, length)).Character('"');
+    return true;
+}
+
+// --- Text arguments ---------------------------------------------------------------------------------------------------
+
+bool TextArgument::Set(const char* word, long length, TextArea area) {
+    text_ = nullptr;
+    length_ = static_cast<uint32_t>(length);
+    if (word == nullptr || IsNull(word)) return true;
+    if (Utf16Mode) return Convert(word, length_, area);
+    return Pass(word);
+}
+
+// Words lie in token buffers. A length beyond those gets a block of its own, unless only the library can refuse it.
+bool TextArgument::Pass(const char* word) {
+    const char* readable = word;
+    if (length_ > kTokenBufferSize && length_ <= kReadableText && !Pad(word, readable)) return false;
+    text_ = reinterpret_cast<unsigned char*>(const_cast<char*>(readable));
+    return true;
+}
+
+bool TextArgument::Pad(const char* word, const char*& padded) {
+    padded_.reset(static_cast<char*>(GetMem(length_)));
+    if (padded_ == nullptr) {
+        Message(kError, "Could not allocate memory\n");
+        return false;
+    }
+    std::memcpy(padded_.get(), word, std::min<size_t>(kTokenBufferSize, length_));
+    padded = padded_.get();
+    return true;
+}
+
+bool TextArgument::Convert(const char* word, uint32_t length, TextArea area) {
+    const uint64_t size = 4 * uint64_t{length} + (area == TextArea::four_times_and_one ? 1 : 0);
+    if (size == 0) {
+        Message(kError, "cbOutLen is zero\n");
+        return false;
+    }
+    if (length > kReadableText) {
+        Message(kError, "Could not allocate memory\n");
+        return false;
+    }
+    const char* input = word;
+    if (length > kTokenBufferSize && !Pad(word, input)) return false;
+    converted_.reset(static_cast<char*>(GetMem(size)));
+    if (converted_ == nullptr) {
+        Message(kError, "Could not allocate memory\n");
+        return false;
+    }
+    const int rc = convertToUTF16(input, length, converted_.get(), static_cast<uint32_t>(size), &length_);
+    text_ = reinterpret_cast<unsigned char*>(converted_.get());
+    return IsTolerated(rc);
+}
