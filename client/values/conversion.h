@@ -1,0 +1,134 @@
+// Conversions between the engine's values (Datum) and the external types of the application's elements, both ways. What
+// converts is looked up once, when a bind or define is made; a value then takes one call through a pointer and allocates
+// nothing once the workspace has grown to the longest value.
+//
+// Conversions answer 0 or a published error number. Truncation is 1406 with the value stored as far as it fits.
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+#include "engine/datum.h"
+#include "values/elements.h"
+
+class Environment;
+
+namespace values {
+
+constexpr int kNullFetched = 1405;
+constexpr int kTruncated = 1406;
+constexpr int kBadRowId = 1410;
+constexpr int kBadPackedDecimal = 1413;
+constexpr int kNumericOverflow = 1426;
+constexpr int kIntegerOverflow = 1455;
+constexpr int kBadVaryingLength = 1458;     // a prefix longer than its area
+constexpr int kBadAreaLength = 1459;        // an area too small for what it must hold, or of negative length
+constexpr int kBadHex = 1465;
+constexpr int kNoTerminator = 1480;
+constexpr int kBadFixedLength = 1483;       // a number or date whose area has the wrong size
+constexpr int kLengthPastArea = 1485;
+constexpr int kInvalidNumber = 1722;
+constexpr int kBadDescriptor = 1866;        // an element that should point to a datetime descriptor
+constexpr int kInconsistentTypes = 932;
+constexpr int kUnknownType = 3115;
+constexpr int kTruncationWarning = 24345;
+constexpr int kBadCharacters = 24365;       // text that cannot be converted to or from UTF-16
+
+// What a select-list column holds, as far as its values convert in their own way.
+enum class ColumnClass : std::uint8_t { plain, number, date, timestamp, timestamp_zone };
+ColumnClass ClassOf(std::uint16_t internal_type);
+
+// Settings of one bind or define, and the room in which its values are put together.
+struct Workspace {
+    Environment* environment = nullptr;
+    bool utf16 = false;                 // character data of the application is UTF-16
+    ColumnClass column = ColumnClass::plain;
+    std::uint8_t precision = 0;         // of packed decimals; 0: as many digits as the area holds
+    std::int8_t scale = 0;
+    std::array<char, 128> small{};     // numbers, dates, row ids
+    std::string text;                   // converted texts and bytes
+    std::string units;                  // text as UTF-16
+};
+
+// An element to be filled. Conversions set `stored` and, when something was cut off, `whole`.
+struct Target {
+    char* at;
+    std::uint32_t size;
+    std::uint32_t stored = 0;    // bytes, as the length array reports them
+    std::size_t whole = 0;       // bytes of the whole value
+};
+
+// An element to be read.
+struct Source {
+    const char* at;
+    std::uint32_t size;
+    bool has_length;
+    std::uint16_t length;
+};
+
+using OutConverter = int (*)(const engine::Datum& datum, Workspace& workspace, Target& target);
+// The Datum is a view of the element or of the workspace; of kind null when the element stands for null.
+using InConverter = int (*)(const Source& source, Workspace& workspace, engine::Datum& datum);
+// A whole value in the form that is handed out in pieces.
+using Renderer = int (*)(const engine::Datum& datum, Workspace& workspace, std::string_view& whole);
+
+// What stands behind a Datum: its kind, or a number that arrives as text.
+constexpr std::size_t kKinds = static_cast<std::size_t>(engine::Kind::cursor) + 1;
+constexpr std::size_t kNumberText = kKinds;
+template <class Function>
+using ByOrigin = std::array<Function, kKinds + 1>;
+// By the kind of Datum, for one column.
+template <class Function>
+using ByKind = std::array<Function, kKinds>;
+
+enum class Family : std::uint8_t { text, bytes, number, integer, real, date, row_id, cursor, lob };
+
+struct ExternalType {
+    std::uint16_t code;
+    Family family;
+    std::uint8_t least_size;    // bytes an area must have
+    bool in_pieces;             // whether values may be given and taken in pieces
+    bool is_pointer;            // the element points to an object
+    InConverter in;
+    const ByOrigin<OutConverter>* out;
+    const ByOrigin<Renderer>* pieces;    // null unless in_pieces
+};
+
+// Null for a code that the library does not know.
+const ExternalType* FindType(std::uint16_t code);
+
+// Whether an area of `size` bytes can hold the type, and how large it counts.
+int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area);
+
+// The row of a table that serves a column.
+template <class Function>
+ByKind<Function> ForColumn(const ByOrigin<Function>& row, ColumnClass column) {
+    ByKind<Function> functions;
+    for (std::size_t kind = 0; kind < kKinds; ++kind) functions[kind] = row[kind];
+    const auto text = static_cast<std::size_t>(engine::Kind::text);
+    if (column == ColumnClass::number) functions[text] = row[kNumberText];
+    else if (column != ColumnClass::plain) functions[text] = row[static_cast<std::size_t>(engine::Kind::timestamp)];
+    return functions;
+}
+
+// Puts one value into an element with its indicator, length and return code. Answers 0, 24345 for what is only a
+// warning (a return code took it), or the error of the call.
+int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter>& converters, Workspace& workspace,
+          const engine::Datum& datum);
+
+// UTF-8 in the application's form: itself, or UTF-16 in the workspace.
+int ToApplication(std::string_view utf8, Workspace& workspace, std::string_view& text);
+
+// Reads one element.
+inline int Load(const Elements& elements, std::size_t index, InConverter in, Workspace& workspace, engine::Datum& datum) {
+    datum.kind = engine::Kind::null;
+    const char* at = elements.Value(index);
+    if (!at || elements.IsNull(index)) return 0;
+    const bool has_length = elements.lengths != nullptr;
+    return in({at, elements.size, has_length, has_length ? elements.Length(index) : std::uint16_t{0}}, workspace, datum);
+}
+
+}  // namespace values

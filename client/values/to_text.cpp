@@ -1,0 +1,295 @@
+// Engine values as character data and as bytes: how each kind is written, and how a written value is laid into an
+// element of each character and raw type. Text is cut between characters, never within one.
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <limits>
+
+#include "date/date.h"
+#include "date/format.h"
+#include "handles/environment.h"
+#include "number/number.h"
+#include "oci.h"
+#include "text/string_object.h"
+#include "values/out_rows.h"
+#include "values/rowid.h"
+
+namespace values {
+namespace {
+
+using engine::Datum;
+using View = std::string_view;
+
+// ---- How values are written
+
+int IntegerText(const Datum& datum, Workspace& workspace, View& text) {
+    char* begin = workspace.small.data();
+    const auto end = std::to_chars(begin, begin + workspace.small.size(), datum.integer);
+    text = {begin, static_cast<std::size_t>(end.ptr - begin)};
+    return 0;
+}
+
+int NumberText(const OCINumber& number, Workspace& workspace, View& text) {
+    static_assert(number::kMaxPlainText <= std::tuple_size_v<decltype(Workspace::small)>);
+    std::size_t length = 0;
+    if (const int error = number::ToPlainText(number, '.', workspace.small.data(), &length)) return error;
+    text = {workspace.small.data(), length};
+    return 0;
+}
+
+// Infinities and what is no number have names; reals of usual size are written directly, in the plain form of numbers.
+int RealText(const Datum& datum, Workspace& workspace, View& text) {
+    const double value = datum.real;
+    if (std::isnan(value)) return text = "Nan", 0;
+    if (std::isinf(value)) return text = value > 0 ? "Inf" : "-Inf", 0;
+    const double magnitude = std::fabs(value);
+    if (magnitude != 0 && (magnitude < 1e-6 || magnitude >= 1e15)) {
+        OCINumber number;
+        if (const int error = number::FromDouble(value, &number)) return error;
+        return NumberText(number, workspace, text);
+    }
+    char* begin = workspace.small.data();
+    const char* end = std::to_chars(begin, begin + workspace.small.size(), value, std::chars_format::fixed).ptr;
+    const bool negative = *begin == '-';
+    if (begin[negative] == '0' && begin + negative + 1 < end) {    // no zero stands before the point
+        ++begin;
+        if (negative) *begin = '-';
+    }
+    text = value == 0 ? View("0") : View(begin, static_cast<std::size_t>(end - begin));
+    return 0;
+}
+
+int DecimalText(const Datum& datum, Workspace& workspace, View& text) {
+    return NumberText(*static_cast<const OCINumber*>(datum.data), workspace, text);
+}
+
+int OwnText(const Datum& datum, Workspace&, View& text) {
+    text = datum.Text();
+    return 0;
+}
+
+// A number that the engine keeps as text, in the plain form; what is no number stays as it is.
+int NumericText(const Datum& datum, Workspace& workspace, View& text) {
+    OCINumber number;
+    if (number::FromPlainText(datum.Text(), '.', &number) != 0) return OwnText(datum, workspace, text);
+    return NumberText(number, workspace, text);
+}
+
+int HexText(const Datum& datum, Workspace& workspace, View& text) {
+    constexpr char kDigits[] = "0123456789ABCDEF";
+    workspace.text.resize(std::size_t{datum.length} * 2);
+    char* at = workspace.text.data();
+    for (const char byte : datum.Text()) {
+        *at++ = kDigits[static_cast<unsigned char>(byte) >> 4];
+        *at++ = kDigits[static_cast<unsigned char>(byte) & 15];
+    }
+    text = workspace.text;
+    return 0;
+}
+
+// "YYYY-MM-DD ..." of the common era as DD-MON-RR, without reading more than that takes. False: another form.
+bool ShortDate(View engine_text, char* text) {
+    constexpr char kMonths[] = "JANFEBMARAPRMAYJUNJULAUGSEPOCTNOVDEC";
+    if (engine_text.size() != 19 || engine_text[4] != '-' || engine_text[7] != '-' || engine_text[10] != ' ') return false;
+    for (const std::size_t digit : {0u, 1u, 2u, 3u, 5u, 6u, 8u, 9u})
+        if (engine_text[digit] < '0' || engine_text[digit] > '9') return false;
+    const int month = (engine_text[5] - '0') * 10 + engine_text[6] - '0';
+    if (month < 1 || month > 12) return false;
+    text[0] = engine_text[8];
+    text[1] = engine_text[9];
+    text[2] = text[6] = '-';
+    std::copy_n(kMonths + (month - 1) * 3, 3, text + 3);
+    text[7] = engine_text[2];
+    text[8] = engine_text[3];
+    return true;
+}
+
+View ModelOf(ColumnClass column) {
+    switch (column) {
+        case ColumnClass::timestamp: return date::kTimestampModel;
+        case ColumnClass::timestamp_zone: return date::kTimestampZoneModel;
+        default: return date::kDateModel;
+    }
+}
+
+// In the default model of the column's type; what is no date stays as it is.
+int DateText(const Datum& datum, Workspace& workspace, View& text) {
+    constexpr std::size_t kShortDate = 9;
+    const View model = ModelOf(workspace.column);
+    char* begin = workspace.small.data();
+    if (model.data() == date::kDateModel.data() && ShortDate(datum.Text(), begin)) {
+        text = {begin, kShortDate};
+        return 0;
+    }
+    date::DateTime value;
+    if (date::FromEngineText(datum.Text(), &value) != 0) return OwnText(datum, workspace, text);
+    std::size_t length = 0;
+    const auto scope = workspace.column == ColumnClass::date ? date::Scope::date : date::Scope::timestamp;
+    if (const int error = date::ToText(value, model, date::kEnglish, scope, begin, workspace.small.size(), &length)) return error;
+    text = {begin, length};
+    return 0;
+}
+
+int RowIdText(const Datum& datum, Workspace& workspace, View& text) {
+    text = {workspace.small.data(), rowid::ToText({datum.length, datum.integer}, workspace.small.data())};
+    return 0;
+}
+
+int NoText(const Datum&, Workspace&, View&) { return kInconsistentTypes; }
+
+// ---- How values become bytes
+
+int HexDigit(char c) {
+    if (c >= '0' && c <= '9') return c - '0';
+    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
+    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
+    return -1;
+}
+
+// Pairs of hexadecimal digits; an odd count has a zero before it.
+int BytesOfHex(const Datum& datum, Workspace& workspace, View& bytes) {
+    const View hex = datum.Text();
+    workspace.text.assign((hex.size() + 1) / 2, '\0');
+    for (std::size_t index = 0; index < hex.size(); ++index) {
+        const int digit = HexDigit(hex[index]);
+        if (digit < 0) return kBadHex;
+        char& byte = workspace.text[(index + hex.size() % 2) / 2];
+        byte = static_cast<char>(static_cast<unsigned char>(byte) << 4 | digit);
+    }
+    bytes = workspace.text;
+    return 0;
+}
+
+// ---- How character data is laid into elements
+
+std::size_t WholeCharacters(View text, std::size_t room) {
+    if (text.size() <= room) return text.size();
+    while (room > 0 && (static_cast<unsigned char>(text[room]) & 0xC0) == 0x80) --room;
+    return room;
+}
+
+std::size_t WholeUnits(View units, std::size_t room) {
+    if (units.size() <= room) return units.size();
+    room = room / 2 * 2;
+    const bool torn_pair = room > 0 && (static_cast<unsigned char>(units[room - 1]) & 0xFC) == 0xD8;
+    return torn_pair ? room - 2 : room;
+}
+
+// Copies as much as `room` takes; answers the bytes copied.
+std::size_t CopyCut(View text, const Workspace& workspace, char* at, std::size_t room, Target& target) {
+    const std::size_t stored = workspace.utf16 ? WholeUnits(text, room) : WholeCharacters(text, room);
+    if (stored > 0) std::memcpy(at, text.data(), stored);
+    target.stored = static_cast<std::uint32_t>(stored);
+    target.whole = text.size();
+    return stored;
+}
+
+int Outcome(const Target& target, std::size_t copied) { return copied < target.whole ? kTruncated : 0; }
+
+int PutChr(View utf8, Workspace& workspace, Target& target) {
+    View text;
+    if (const int error = ToApplication(utf8, workspace, text)) return error;
+    return Outcome(target, CopyCut(text, workspace, target.at, target.size, target));
+}
+
+// Closed with a zero that the length does not count.
+int PutStr(View utf8, Workspace& workspace, Target& target) {
+    View text;
+    if (const int error = ToApplication(utf8, workspace, text)) return error;
+    const std::size_t zero = workspace.utf16 ? 2 : 1;
+    target.whole = text.size();
+    if (target.size < zero) return kTruncated;
+    const std::size_t stored = CopyCut(text, workspace, target.at, target.size - zero, target);
+    std::memset(target.at + stored, 0, zero);
+    return Outcome(target, stored);
+}
+
+// Padded with blanks to the end of the area, which is its length.
+int PutAfc(View utf8, Workspace& workspace, Target& target) {
+    View text;
+    if (const int error = ToApplication(utf8, workspace, text)) return error;
+    const std::size_t stored = CopyCut(text, workspace, target.at, target.size, target);
+    if (!workspace.utf16) {
+        std::memset(target.at + stored, ' ', target.size - stored);
+    } else {
+        constexpr char16_t kBlank = u' ';
+        for (std::size_t at = stored; at + 2 <= target.size; at += 2) std::memcpy(target.at + at, &kBlank, 2);
+    }
+    target.stored = target.size;
+    return Outcome(target, stored);
+}
+
+// The first `stored` bytes behind a count of them.
+template <class Prefix>
+int LayPrefixed(View text, std::size_t stored, Target& target) {
+    const auto prefix = static_cast<Prefix>(stored);
+    std::memcpy(target.at, &prefix, sizeof prefix);
+    if (stored > 0) std::memcpy(target.at + sizeof prefix, text.data(), stored);
+    target.stored = static_cast<std::uint32_t>(stored + sizeof prefix);
+    target.whole = text.size();
+    return Outcome(target, stored);
+}
+template <class Prefix>
+std::size_t PrefixedRoom(const Target& target) {
+    return std::min<std::size_t>(target.size - sizeof(Prefix), std::numeric_limits<Prefix>::max());
+}
+
+template <class Prefix>
+int PutPrefixed(View utf8, Workspace& workspace, Target& target) {
+    View text;
+    if (const int error = ToApplication(utf8, workspace, text)) return error;
+    const std::size_t room = PrefixedRoom<Prefix>(target);
+    return LayPrefixed<Prefix>(text, workspace.utf16 ? WholeUnits(text, room) : WholeCharacters(text, room), target);
+}
+
+// ---- How bytes are
+
+int PutBin(View bytes, Workspace&, Target& target) {
+    const std::size_t stored = std::min<std::size_t>(bytes.size(), target.size);
+    if (stored > 0) std::memcpy(target.at, bytes.data(), stored);
+    target.stored = static_cast<std::uint32_t>(stored);
+    target.whole = bytes.size();
+    return Outcome(target, stored);
+}
+
+int PutVbi(View bytes, Workspace&, Target& target) {
+    return LayPrefixed<std::uint16_t>(bytes, std::min(bytes.size(), PrefixedRoom<std::uint16_t>(target)), target);
+}
+
+template <auto put>
+constexpr ByOrigin<OutConverter> kTextRow = {
+    NoConversion,                    Through<View, IntegerText, put>, Through<View, RealText, put>,
+    Through<View, DecimalText, put>, Through<View, OwnText, put>,     Through<View, HexText, put>,
+    Through<View, DateText, put>,    NoConversion,                    Through<View, RowIdText, put>,
+    NoConversion,                    Through<View, NumericText, put>};
+
+template <auto put>
+constexpr ByOrigin<OutConverter> kBytesRow = {
+    NoConversion, NoConversion, NoConversion, NoConversion, Through<View, BytesOfHex, put>, Through<View, OwnText, put>,
+    NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
+
+}  // namespace
+
+int ToApplication(View utf8, Workspace& workspace, View& text) {
+    text = utf8;
+    if (!workspace.utf16) return 0;
+    workspace.units.clear();
+    if (!utf::ToUtf16(utf8, workspace.units)) return kBadCharacters;
+    text = workspace.units;
+    return 0;
+}
+
+const ByOrigin<OutConverter> kToChr = kTextRow<PutChr>;
+const ByOrigin<OutConverter> kToStr = kTextRow<PutStr>;
+const ByOrigin<OutConverter> kToAfc = kTextRow<PutAfc>;
+const ByOrigin<OutConverter> kToPrefix2 = kTextRow<PutPrefixed<std::uint16_t>>;
+const ByOrigin<OutConverter> kToPrefix4 = kTextRow<PutPrefixed<std::uint32_t>>;
+const ByOrigin<OutConverter> kToBin = kBytesRow<PutBin>;
+const ByOrigin<OutConverter> kToVbi = kBytesRow<PutVbi>;
+
+const ByOrigin<Renderer> kWholeText = {NoText, IntegerText, RealText, DecimalText, OwnText, HexText,
+                                       DateText, NoText, RowIdText, NoText, NumericText};
+const ByOrigin<Renderer> kWholeBytes = {NoText, NoText, NoText, NoText, BytesOfHex, OwnText,
+                                        NoText, NoText, NoText, NoText, NoText};
+
+}  // namespace values
