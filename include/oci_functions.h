@@ -3,7 +3,8 @@
    Rules of all functions here and in oci_values.h and oci_services.h: a `sword` result is a return code of
    oci_constants.h; what went wrong is read from the error handle with OCIErrorGet. A handle that is null or no living
    object of its kind is answered with OCI_INVALID_HANDLE and nothing is recorded. Lengths are in bytes and texts need
-   no terminator where a length is given. What a function hands out through a pointer to a pointer stays the library's. */
+   no terminator where a length is given. What a function hands out through a pointer to a pointer stays the
+   library's. */
 #ifndef OCI_FUNCTIONS_H
 #define OCI_FUNCTIONS_H
 
