@@ -1,0 +1,222 @@
+// The probe library: exports the whole call interface, records each call with its arguments, and answers as a test tells
+// it. A test of the driver reads in the log what the library was really called with.
+//
+// A call is recorded as one line, "    probe: OCIPing(h3, h2, 0) = 0", on standard output, in order with the driver's own
+// text, or at the end of the file that PROBE_LOG names. A pointer reads as "null", as the name of what the probe handed
+// out ("h1", "h2", ... in the order of making), as a quoted text where a text and its length follow each other, or as
+// "pointer".
+//
+// PROBE_ANSWERS names a file of answers, a line each: FUNCTION RESULT [POSITION=TYPE:VALUE]...; what stands at POSITION,
+// counted from 1, is an output to fill: TYPE is i1, i2, i4, i8 for integers by width, t for a terminated text, f8 for a
+// double. Answers for a function are used in order, the last one again and again; without any the result is 0. A result
+// of 0 hands out a new object through the first pointer to a pointer.
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <deque>
+#include <fstream>
+#include <map>
+#include <mutex>
+#include <sstream>
+#include <string>
+#include <type_traits>
+#include <vector>
+
+#include "oci.h"
+#include "kelpci.h"
+
+namespace {
+
+struct Output {
+    size_t position;
+    std::string type;
+    std::string value;
+};
+
+struct Answer {
+    long long result = 0;
+    std::vector<Output> outputs;
+};
+
+// One argument as the call passed it.
+struct Argument {
+    enum Form { integer, pointer, text, place } form;    // place: a pointer to a pointer
+    long long number;
+    const void* address;
+};
+
+struct State {
+    std::mutex mutex;
+    std::map<std::string, std::deque<Answer>> answers;
+    std::map<const void*, size_t> objects;
+    std::deque<std::vector<char>> memory;
+    std::FILE* log = nullptr;    // null: standard output
+};
+
+Answer ReadAnswer(std::istringstream& words) {
+    Answer answer;
+    words >> answer.result;
+    for (std::string word; words >> word;) {
+        const size_t equals = word.find('=');
+        const size_t colon = word.find(':', equals);
+        if (colon == std::string::npos) {
+            std::fprintf(stderr, "probe: cannot read answer %s\n", word.c_str());
+            std::abort();
+        }
+        answer.outputs.push_back({std::stoul(word), word.substr(equals + 1, colon - equals - 1), word.substr(colon + 1)});
+    }
+    return answer;
+}
+
+State* MakeState() {
+    auto* state = new State;
+    if (const char* log = std::getenv("PROBE_LOG")) state->log = std::fopen(log, "a");
+    if (const char* file = std::getenv("PROBE_ANSWERS")) {
+        std::ifstream lines(file);
+        for (std::string line; std::getline(lines, line);) {
+            std::istringstream words(line);
+            std::string function;
+            if (words >> function && function[0] != '#') state->answers[function].push_back(ReadAnswer(words));
+        }
+    }
+    return state;
+}
+
+// Never destroyed: the driver may call until it ends.
+State& TheState() {
+    static State* state = MakeState();
+    return *state;
+}
+
+Answer NextAnswer(State& state, const char* function) {
+    const auto found = state.answers.find(function);
+    if (found == state.answers.end()) return {};
+    const Answer answer = found->second.front();
+    if (found->second.size() > 1) found->second.pop_front();
+    return answer;
+}
+
+void AppendText(std::string& line, const void* text, long long length) {
+    constexpr long long kShown = 64;
+    const auto* bytes = static_cast<const unsigned char*>(text);
+    line += '"';
+    for (long long index = 0; index < std::min(length, kShown); ++index) {
+        char hexadecimal[5];
+        std::snprintf(hexadecimal, sizeof hexadecimal, "\\x%02X", bytes[index]);
+        if (bytes[index] >= ' ' && bytes[index] < 127) line += static_cast<char>(bytes[index]);
+        else line += hexadecimal;
+    }
+    line += '"';
+}
+
+void AppendArgument(State& state, std::string& line, const Argument& argument, const Argument* next) {
+    if (argument.form == Argument::integer) {
+        line += std::to_string(argument.number);
+    } else if (!argument.address) {
+        line += "null";
+    } else if (const auto object = state.objects.find(argument.address); object != state.objects.end()) {
+        line += "h" + std::to_string(object->second);
+    } else if (argument.form == Argument::text && next && next->form == Argument::integer) {
+        AppendText(line, argument.address, next->number);
+    } else {
+        line += "pointer";
+    }
+}
+
+void Record(State& state, const char* function, const std::vector<Argument>& arguments, long long result) {
+    std::string line = std::string("    probe: ") + function + "(";
+    for (size_t index = 0; index < arguments.size(); ++index) {
+        if (index > 0) line += ", ";
+        AppendArgument(state, line, arguments[index], index + 1 < arguments.size() ? &arguments[index + 1] : nullptr);
+    }
+    line += ") = " + std::to_string(result) + "\n";
+    std::FILE* const log = state.log ? state.log : stdout;
+    std::fputs(line.c_str(), log);
+    std::fflush(log);
+}
+
+void HandOut(State& state, const std::vector<Argument>& arguments) {
+    constexpr size_t kObjectSize = 256;
+    for (const Argument& argument : arguments) {
+        if (argument.form != Argument::place) continue;
+        if (!argument.address) return;
+        state.memory.emplace_back(kObjectSize);
+        void* object = state.memory.back().data();
+        state.objects.emplace(object, state.objects.size() + 1);
+        *static_cast<void**>(const_cast<void*>(argument.address)) = object;
+        return;
+    }
+}
+
+template <class Value>
+void Store(const void* place, Value value) {
+    std::memcpy(const_cast<void*>(place), &value, sizeof value);
+}
+
+void Fill(const Output& output, const std::vector<Argument>& arguments) {
+    if (output.position == 0 || output.position > arguments.size()) return;
+    const void* place = arguments[output.position - 1].address;
+    if (!place) return;
+    if (output.type == "i1") Store(place, static_cast<signed char>(std::stoll(output.value)));
+    else if (output.type == "i2") Store(place, static_cast<short>(std::stoll(output.value)));
+    else if (output.type == "i4") Store(place, static_cast<int>(std::stoll(output.value)));
+    else if (output.type == "i8") Store(place, std::stoll(output.value));
+    else if (output.type == "f8") Store(place, std::stod(output.value));
+    else std::memcpy(const_cast<void*>(place), output.value.c_str(), output.value.size() + 1);
+}
+
+template <class T>
+Argument Describe(T argument) {
+    if constexpr (!std::is_pointer_v<T>) {
+        return {Argument::integer, static_cast<long long>(argument), nullptr};
+    } else {
+        const void* address = reinterpret_cast<const void*>(argument);
+        using Target = std::remove_pointer_t<T>;
+        if constexpr (std::is_same_v<Target, const OraText>) return {Argument::text, 0, address};
+        else if constexpr (std::is_pointer_v<Target> && !std::is_const_v<std::remove_pointer_t<Target>>)
+            return {Argument::place, 0, address};
+        else return {Argument::pointer, 0, address};
+    }
+}
+
+enum Index : size_t {
+#define FUNCTION(symbol) kIndexOf##symbol,
+#include "platform/client_functions.def"
+#undef FUNCTION
+};
+const char* const kNames[] = {
+#define FUNCTION(symbol) #symbol,
+#include "platform/client_functions.def"
+#undef FUNCTION
+};
+
+// What every exported name leads to: the same function, once for each signature and name.
+template <class Signature, size_t kIndex>
+struct Entry;
+template <class Result, class... Parameters, size_t kIndex>
+struct Entry<Result(Parameters...), kIndex> {
+    static Result Called(Parameters... parameters) {
+        State& state = TheState();
+        const std::lock_guard lock(state.mutex);
+        const Answer answer = NextAnswer(state, kNames[kIndex]);
+        const std::vector<Argument> arguments{Describe(parameters)...};
+        Record(state, kNames[kIndex], arguments, answer.result);
+        if (answer.result == 0) HandOut(state, arguments);
+        for (const Output& output : answer.outputs) Fill(output, arguments);
+        if constexpr (std::is_pointer_v<Result>) return nullptr;
+        else if constexpr (!std::is_void_v<Result>) return static_cast<Result>(answer.result);
+    }
+};
+
+}  // namespace
+
+// The signatures come from the headers, so the exported symbols are bound to the template's instances by the loader.
+#define FUNCTION(symbol)                                                                                        \
+    extern "C" __attribute__((used, visibility("hidden"), no_sanitize("address", "thread", "undefined")))       \
+    decltype(::symbol)* Resolve##symbol() {                                                                     \
+        return &Entry<decltype(::symbol), kIndexOf##symbol>::Called;                                            \
+    }                                                                                                           \
+    extern "C" __attribute__((ifunc("Resolve" #symbol), visibility("default"))) decltype(::symbol) symbol;
+#include "platform/client_functions.def"
+#undef FUNCTION
