@@ -9,6 +9,7 @@
 
 namespace date {
 
+constexpr Errno kBadZone = 1857;
 constexpr Errno kBadZoneHour = 1874;
 constexpr Errno kBadZoneMinute = 1875;
 constexpr Errno kUnknownRegion = 1882;
@@ -17,6 +18,9 @@ constexpr Errno kUnknownRegion = 1882;
 // the offset is the one in force at that local time; of an hour that comes twice the first is meant, one that is skipped
 // counts with the offset before it. Empty: the zone of the process.
 Errno SetZone(std::string_view zone, DateTime* value) noexcept;
+
+// Gives it an offset, from 12 hours west to 14 hours east.
+Errno SetOffset(bool west, int hours, int minutes, DateTime* value) noexcept;
 
 // The name of a value's region; empty without one.
 std::string_view RegionName(const DateTime& value) noexcept;

@@ -1,0 +1,37 @@
+// Letters: tests and letter case without regard to the locale. Case is known for ASCII and, in UTF-8, for the accented
+// letters of western Europe, which is what the names of months and days need.
+#pragma once
+
+#include <cstddef>
+#include <string_view>
+
+namespace date {
+
+constexpr bool IsDigit(char c) { return c >= '0' && c <= '9'; }
+constexpr bool IsLetter(char c) { return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z'); }
+// Letters, and the bytes that letters beyond ASCII are made of.
+constexpr bool IsWordByte(char c) { return IsLetter(c) || static_cast<unsigned char>(c) >= 0x80; }
+constexpr char ToUpper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; }
+
+// The byte at `index` as it is when its character is written large.
+constexpr char UpperByte(std::string_view text, std::size_t index) {
+    const char c = text[index];
+    if (index == 0 || text[index - 1] != '\xC3') return ToUpper(c);
+    const auto trail = static_cast<unsigned char>(c);
+    return trail >= 0xA0 && trail <= 0xBE && trail != 0xB7 ? static_cast<char>(trail - 0x20) : c;
+}
+
+// Whether `text` begins with `prefix`, letter case aside.
+constexpr bool StartsWithFolded(std::string_view text, std::string_view prefix) {
+    if (text.size() < prefix.size()) return false;
+    for (std::size_t i = 0; i < prefix.size(); ++i) {
+        if (UpperByte(text, i) != UpperByte(prefix, i)) return false;
+    }
+    return true;
+}
+
+constexpr bool EqualFolded(std::string_view left, std::string_view right) {
+    return left.size() == right.size() && StartsWithFolded(left, right);
+}
+
+}  // namespace date

@@ -1,0 +1,225 @@
+// Zones of values: parsing what names one, the regions read so far, and comparing across zones.
+#include "date/zone.h"
+
+#include <sys/stat.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <shared_mutex>
+#include <string>
+#include <vector>
+
+#include "date/letters.h"
+#include "date/zone_rules.h"
+
+namespace date {
+namespace {
+
+constexpr Errno kOutOfMemory = 1019;
+constexpr const char* kZoneDirectory = "/usr/share/zoneinfo/";
+constexpr const char* kLocalZone = "/etc/localtime";
+constexpr std::size_t kMaxFile = 1 << 20;
+
+bool ReadRegularFile(const std::string& path, std::string* bytes) {
+    struct stat status {};
+    if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) return false;
+    if (status.st_size < 0 || static_cast<std::size_t>(status.st_size) > kMaxFile) return false;
+    const std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rbe"), std::fclose);
+    if (!file) return false;
+    bytes->resize(static_cast<std::size_t>(status.st_size));
+    return std::fread(bytes->data(), 1, bytes->size(), file.get()) == bytes->size();
+}
+
+std::optional<ZoneRules> LoadFile(const std::string& path) {
+    std::string bytes;
+    if (!ReadRegularFile(path, &bytes)) return std::nullopt;
+    return ZoneRules::FromFile(bytes);
+}
+
+// A name of letters, digits, + - _ in parts that do not begin with anything else, so that no path leads elsewhere.
+bool IsRegionName(std::string_view name) {
+    bool part_start = true;
+    for (const char c : name) {
+        if (c == '/' ? part_start : !IsLetter(c) && !IsDigit(c) && c != '+' && c != '-' && c != '_') return false;
+        part_start = c == '/';
+    }
+    return !name.empty() && name.size() <= 64 && !part_start;
+}
+
+struct Region {
+    std::string name;
+    ZoneRules rules;
+};
+
+// Regions are added and never go, so that a value's number stays good and views of names stay valid.
+class Regions {
+public:
+    // 0: unknown.
+    std::uint16_t Find(std::string_view name) {
+        {
+            const std::shared_lock lock(mutex_);
+            if (const auto found = numbers_.find(name); found != numbers_.end()) return found->second;
+        }
+        if (!IsRegionName(name)) return 0;
+        std::optional<ZoneRules> rules = LoadFile(kZoneDirectory + std::string(name));
+        if (!rules) return 0;
+        const std::unique_lock lock(mutex_);
+        if (const auto found = numbers_.find(name); found != numbers_.end()) return found->second;
+        if (all_.size() >= UINT16_MAX) return 0;
+        all_.push_back(std::make_unique<Region>(Region{std::string(name), std::move(*rules)}));
+        const auto number = static_cast<std::uint16_t>(all_.size());
+        numbers_.emplace(name, number);
+        return number;
+    }
+
+    const Region* Get(std::uint16_t number) {
+        const std::shared_lock lock(mutex_);
+        return number == 0 || number > all_.size() ? nullptr : all_[number - 1U].get();
+    }
+
+private:
+    std::shared_mutex mutex_;
+    std::map<std::string, std::uint16_t, std::less<>> numbers_;
+    std::vector<std::unique_ptr<Region>> all_;
+};
+
+// Never destroyed: threads may still ask while the process ends.
+Regions& TheRegions() {
+    static auto* regions = new Regions;
+    return *regions;
+}
+
+// What TZ names, else the system's zone, else Greenwich.
+ZoneRules LoadProcessZone() {
+    const char* variable = std::getenv("TZ");
+    std::optional<ZoneRules> rules;
+    if (!variable) {
+        rules = LoadFile(kLocalZone);
+    } else {
+        std::string_view name = variable;
+        if (name.starts_with(':')) name.remove_prefix(1);
+        if (name.starts_with('/')) rules = LoadFile(std::string(name));
+        else if (IsRegionName(name)) rules = LoadFile(kZoneDirectory + std::string(name));
+        if (!rules) rules = ZoneRules::FromText(name);
+    }
+    return rules ? std::move(*rules) : ZoneRules();
+}
+
+const ZoneRules& ProcessZone() {
+    static const auto* rules = new ZoneRules(LoadProcessZone());
+    return *rules;
+}
+
+std::int64_t WallSeconds(const DateTime& value) {
+    return (ToDayNumber(value) - kEpochDay) * std::int64_t{86400} + (value.hour * 60 + value.minute) * 60 + value.second;
+}
+
+// Offsets are kept in minutes; before 1900 zones had seconds, which are rounded.
+int OffsetMinutes(const ZoneState& state) { return (state.offset + (state.offset < 0 ? -30 : 30)) / 60; }
+
+void SetOffset(int minutes, std::uint16_t region, DateTime* value) {
+    value->has_zone = true;
+    value->zone_minutes = static_cast<std::int16_t>(minutes);
+    value->region = region;
+}
+
+std::int64_t MomentSeconds(const DateTime& value) {
+    const std::int64_t wall = WallSeconds(value);
+    const int minutes = value.has_zone ? value.zone_minutes : OffsetMinutes(ProcessZone().AtWallTime(wall));
+    return wall - minutes * std::int64_t{60};
+}
+
+Errno MoveSeconds(std::int64_t seconds, DateTime* value) {
+    seconds += (value->hour * 60 + value->minute) * 60 + value->second;
+    const std::int64_t second_of_day = (seconds % 86400 + 86400) % 86400;
+    if (const Errno number = AddDays(*value, (seconds - second_of_day) / 86400, value)) return number;
+    value->hour = static_cast<std::uint8_t>(second_of_day / 3600);
+    value->minute = static_cast<std::uint8_t>(second_of_day / 60 % 60);
+    value->second = static_cast<std::uint8_t>(second_of_day % 60);
+    return 0;
+}
+
+// One or two digits, from the left.
+bool TakeNumber(std::string_view& text, int* value) {
+    std::size_t count = 0;
+    for (*value = 0; count < text.size() && count < 2 && IsDigit(text[count]); ++count) {
+        *value = *value * 10 + (text[count] - '0');
+    }
+    text.remove_prefix(count);
+    return count > 0;
+}
+
+Errno SetWrittenOffset(std::string_view text, DateTime* value) {
+    const bool west = text.front() == '-';
+    text.remove_prefix(1);
+    int hours = 0, minutes = 0;
+    if (!TakeNumber(text, &hours)) return kBadZone;
+    if (text.starts_with(':')) {
+        text.remove_prefix(1);
+        if (!TakeNumber(text, &minutes)) return kBadZone;
+    }
+    return text.empty() ? SetOffset(west, hours, minutes, value) : kBadZone;
+}
+
+Errno SetRegion(std::string_view name, DateTime* value) {
+    const std::uint16_t number = TheRegions().Find(name);
+    if (number == 0) return kUnknownRegion;
+    const ZoneRules& rules = TheRegions().Get(number)->rules;
+    SetOffset(OffsetMinutes(rules.AtWallTime(WallSeconds(*value))), number, value);
+    return 0;
+}
+
+}  // namespace
+
+Errno SetOffset(bool west, int hours, int minutes, DateTime* value) noexcept {
+    if (hours > 14 || (west && hours * 60 + minutes > 12 * 60 && minutes < 60)) return kBadZoneHour;
+    if (minutes > 59) return kBadZoneMinute;
+    SetOffset((west ? -1 : 1) * (hours * 60 + minutes), 0, value);
+    return 0;
+}
+
+Errno SetZone(std::string_view zone, DateTime* value) noexcept try {
+    if (zone.empty()) {
+        SetOffset(OffsetMinutes(ProcessZone().AtWallTime(WallSeconds(*value))), 0, value);
+        return 0;
+    }
+    return zone.front() == '+' || zone.front() == '-' ? SetWrittenOffset(zone, value) : SetRegion(zone, value);
+} catch (const std::bad_alloc&) {
+    return kOutOfMemory;
+}
+
+std::string_view RegionName(const DateTime& value) noexcept {
+    const Region* region = TheRegions().Get(value.region);
+    return region ? std::string_view(region->name) : std::string_view();
+}
+
+std::string_view ZoneAbbreviation(const DateTime& value) noexcept {
+    const Region* region = TheRegions().Get(value.region);
+    return region ? region->rules.At(MomentSeconds(value)).abbreviation : std::string_view();
+}
+
+int CompareMoments(const DateTime& left, const DateTime& right) noexcept {
+    if (!left.has_zone && !right.has_zone) return Compare(left, right);
+    const std::int64_t left_seconds = MomentSeconds(left), right_seconds = MomentSeconds(right);
+    if (left_seconds != right_seconds) return left_seconds < right_seconds ? -1 : 1;
+    if (left.nanosecond != right.nanosecond) return left.nanosecond < right.nanosecond ? -1 : 1;
+    return 0;
+}
+
+Errno ToOffset(const DateTime& value, int zone_minutes, DateTime* result) noexcept {
+    DateTime moved = value;
+    const std::int64_t wall = MomentSeconds(value) + zone_minutes * std::int64_t{60};
+    if (const Errno number = MoveSeconds(wall - WallSeconds(value), &moved)) return number;
+    SetOffset(zone_minutes, 0, &moved);
+    *result = moved;
+    return 0;
+}
+
+Errno ToLocal(const DateTime& value, DateTime* result) noexcept {
+    return ToOffset(value, OffsetMinutes(ProcessZone().At(MomentSeconds(value))), result);
+}
+
+}  // namespace date
