@@ -77,6 +77,7 @@ struct Dialect {
     char placeholder_mark = '?';             // before the placeholder's number: ?1, $1
     std::span<const Spelling> types;         // replaced as whole words in definition statements and casts
     std::span<const Spelling> functions;     // replaced as whole words in expressions
+    std::span<const Spelling> casts;         // type, function: "cast(e as T(a, b))" becomes "F(e, a, b)"
     bool has_dual = false;                   // whether "from dual" is understood as it stands
     bool has_for_update = false;             // whether "for update" is; cut off where it is not
     bool has_date_literals = false;          // whether date '...' and timestamp '...' are; plain texts where not
@@ -109,8 +110,10 @@ public:
     virtual Status Ping() = 0;
     virtual std::string ServerVersion() = 0;    // the text that OCIServerVersion answers
 
-    // Stops the call that runs, which then answers error 1013. From any thread; does nothing when none runs.
+    // Stops the call that runs, or the next one that executes or fetches: it answers error 1013. From any thread.
     virtual void Cancel() noexcept = 0;
+    // Forgets a cancellation that has met no call yet. From any thread.
+    virtual void ForgetCancel() noexcept = 0;
 
     // Row number of the last row that an insert, update or delete touched; 0 when none did.
     virtual std::int64_t LastRowNumber() const = 0;

@@ -1,0 +1,39 @@
+// Which database a name stands for, and which engine opens it.
+#include <cstdlib>
+#include <string>
+
+#include "engine/engine.h"
+#include "engine/sqlite/sqlite.h"
+
+namespace engine {
+namespace {
+
+constexpr int kNoDriver = 21520;
+constexpr const char* kDefaultName = "kelp";
+
+// The directory of kelpcli.ini and of the databases that a plain word names.
+std::string Home() {
+    const char* home = std::getenv("KELPCI_HOME");
+    return home && *home ? home : ".";
+}
+
+bool IsUrl(std::string_view database) {
+    return database.starts_with("postgresql://") || database.starts_with("postgres://");
+}
+
+std::string FileOf(std::string_view database) {
+    if (database == ":memory:" || database.find('/') != std::string_view::npos || database.ends_with(".db")) {
+        return std::string(database);
+    }
+    return Home() + '/' + std::string(database) + ".db";
+}
+
+}  // namespace
+
+Status Connect(std::string_view database, std::unique_ptr<Connection>& connection) {
+    if (database.empty()) database = kDefaultName;
+    if (IsUrl(database)) return Error(kNoDriver, "no PostgreSQL engine in this build");
+    return sqlite::Connect(FileOf(database), connection);
+}
+
+}  // namespace engine

@@ -1,0 +1,18 @@
+// Declared types: what a column's declaration says about its values. SQLite keeps the words and looks at little of them.
+#pragma once
+
+#include <string_view>
+
+#include "engine/engine.h"
+
+namespace engine::sqlite {
+
+// Fills type, size, precision and scale from the words of a declaration, like "number(12,2)". False: the words say
+// nothing known; the column is then one of text without a limit.
+bool ReadDeclaredType(std::string_view declared, Column& column);
+
+// Whether values of the type are numbers; whether they are dates and times, kept as text.
+bool IsNumberType(std::uint16_t type);
+bool IsDateType(std::uint16_t type);
+
+}  // namespace engine::sqlite

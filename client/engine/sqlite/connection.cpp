@@ -1,0 +1,190 @@
+#include "engine/sqlite/connection.h"
+
+#include <cctype>
+#include <thread>
+
+#include "engine/sqlite/accounts.h"
+#include "engine/sqlite/errors.h"
+#include "engine/sqlite/functions.h"
+#include "engine/sqlite/query.h"
+#include "engine/sqlite/sqlite.h"
+
+namespace engine::sqlite {
+namespace {
+
+using namespace std::chrono_literals;
+
+constexpr auto kLockWait = 2000ms;    // how long a call waits for another session's transaction
+constexpr int kStepsBetweenChecks = 2000;
+constexpr int kNotProperlyEnded = 933;
+constexpr int kNoStatement = 900;
+constexpr int kStatementTooLong = 1489;
+constexpr int kRolledBack = 2091;
+
+// Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
+constexpr Dialect::Spelling kTypes[] = {
+    {"decfloat", "kelp_decfloat"},    // without "floa", which would make every value a real
+    {"long raw", "long raw"},
+    {"long", "long varchar"},
+};
+constexpr Dialect::Spelling kFunctions[] = {
+    {"sysdate", "kelp_sysdate()"},
+    {"current_date", "kelp_sysdate()"},
+    {"systimestamp", "kelp_systimestamp()"},
+    {"current_timestamp", "kelp_systimestamp()"},
+    {"localtimestamp", "kelp_systimestamp()"},
+};
+
+}  // namespace
+
+Status Connect(const std::string& file, std::unique_ptr<Connection>& connection) {
+    sqlite3* opened = nullptr;
+    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE;
+    const int code = sqlite3_open_v2(file.c_str(), &opened, flags, nullptr);
+    DatabaseHandle database(opened);
+    if (code != SQLITE_OK) return opened ? Failure(opened, code) : Failure(code, sqlite3_errstr(code));
+    auto made = std::make_unique<SqliteConnection>(std::move(database));
+    Status status = made->Prime();
+    if (status.Ok()) connection = std::move(made);
+    return status;
+}
+
+SqliteConnection::SqliteConnection(DatabaseHandle database) : database_(std::move(database)) {
+    sqlite3_busy_handler(database_.get(), OnBusy, this);
+    sqlite3_progress_handler(database_.get(), kStepsBetweenChecks, OnProgress, this);
+    sqlite3_update_hook(database_.get(), OnChange, this);
+}
+
+SqliteConnection::~SqliteConnection() = default;    // closing rolls back
+
+Status SqliteConnection::Prime() {
+    private_ = *sqlite3_db_filename(database_.get(), "main") == '\0';
+    Status status = AddFunctions(database_.get());
+    if (status.Ok()) status = Run("select count(*) from sqlite_schema");    // not a database; cannot be read
+    // A file that cannot be written keeps the journal it has.
+    if (status.Ok() && !private_ && !sqlite3_db_readonly(database_.get(), "main")) status = Run("pragma journal_mode=wal");
+    if (status.Ok()) status = Run("pragma foreign_keys=on");
+    if (status.Ok()) utf8_ = Text("pragma encoding") == "UTF-8";
+    return status;
+}
+
+Status SqliteConnection::Authenticate(const Credentials& credentials) {
+    return engine::sqlite::Authenticate(*this, credentials);
+}
+
+Status SqliteConnection::ChangePassword(const std::string& user, const std::string& old_password,
+                                        const std::string& new_password) {
+    return engine::sqlite::ChangePassword(*this, user, old_password, new_password);
+}
+
+Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& query, std::uint32_t& error_offset) {
+    if (sql.size() > 1000000000) return Error(kStatementTooLong).From("SQLITE");
+    sqlite3* database = database_.get();
+    sqlite3_stmt* compiled = nullptr;
+    const char* rest = nullptr;
+    const int code = sqlite3_prepare_v3(database, sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
+                                        &compiled, &rest);
+    StatementHandle statement(compiled);
+    if (code != SQLITE_OK) {
+        const int offset = sqlite3_error_offset(database);
+        if (offset >= 0) error_offset = static_cast<std::uint32_t>(offset);
+        return Failure(database, code);
+    }
+    if (!statement) return Error(kNoStatement).From("SQLITE");
+
+    sqlite3_stmt* another = nullptr;
+    const std::string_view left = sql.substr(static_cast<std::size_t>(rest - sql.data()));
+    const int rest_code = sqlite3_prepare_v3(database, left.data(), static_cast<int>(left.size()), 0, &another, nullptr);
+    sqlite3_finalize(another);
+    if (rest_code != SQLITE_OK || another) {
+        error_offset = static_cast<std::uint32_t>(sql.size() - left.size());
+        return Error(kNotProperlyEnded).From("SQLITE");
+    }
+    query = std::make_unique<SqliteQuery>(*this, std::move(statement), sql);
+    return {};
+}
+
+Status SqliteConnection::Begin() {
+    if (InTransaction()) return {};
+    ReadAhead(nullptr);
+    return Run("begin immediate");
+}
+
+// A deferred constraint that fails at the end undoes the transaction.
+Status SqliteConnection::Commit() {
+    if (!InTransaction()) return {};
+    Status status = Run("commit");
+    if (status.Number() != 2291 && status.Number() != 2292) return status;
+    Status undone = Rollback();
+    return undone.Failed() ? undone : Error(kRolledBack, status.Detail()).From("SQLITE");
+}
+
+Status SqliteConnection::Rollback() {
+    if (!InTransaction()) return {};
+    ReadAhead(nullptr);
+    return Run("rollback");
+}
+
+Status SqliteConnection::Ping() { return Run("select count(*) from sqlite_schema"); }
+
+std::string SqliteConnection::ServerVersion() {
+    std::string text = std::string("KELP embedded engine, SQLite ") + sqlite3_libversion() + "\nDatabase ";
+    return text += private_ ? "in memory" : sqlite3_db_filename(database_.get(), "main");
+}
+
+const Dialect& SqliteConnection::GetDialect() const {
+    static constexpr Dialect kDialect{'?', kTypes, kFunctions, kCasts, false, false, false};
+    return kDialect;
+}
+
+void SqliteConnection::Join(SqliteQuery& query) noexcept {
+    query.next_ = first_open_;
+    if (first_open_) first_open_->previous_ = &query;
+    first_open_ = &query;
+}
+
+void SqliteConnection::Leave(SqliteQuery& query) noexcept {
+    if (query.previous_) query.previous_->next_ = query.next_;
+    else if (first_open_ == &query) first_open_ = query.next_;
+    if (query.next_) query.next_->previous_ = query.previous_;
+    query.previous_ = query.next_ = nullptr;
+}
+
+void SqliteConnection::ReadAhead(const SqliteQuery* except) {
+    for (SqliteQuery* query = first_open_; query;) {
+        SqliteQuery* next = query->next_;    // reading ahead takes the query off the list
+        if (query != except) query->ReadAhead();
+        query = next;
+    }
+}
+
+int SqliteConnection::OnProgress(void* self) { return static_cast<SqliteConnection*>(self)->Cancelled(); }
+
+int SqliteConnection::OnBusy(void* self, int attempts) {
+    auto& connection = *static_cast<SqliteConnection*>(self);
+    const auto now = std::chrono::steady_clock::now();
+    if (attempts == 0) connection.busy_since_ = now;
+    if (connection.Cancelled() || now - connection.busy_since_ > kLockWait) return 0;
+    std::this_thread::sleep_for(std::min(1ms * (attempts + 1), 20ms));
+    return 1;
+}
+
+void SqliteConnection::OnChange(void* self, int, const char*, const char*, sqlite3_int64 row) {
+    static_cast<SqliteConnection*>(self)->last_row_ = row;
+}
+
+Status SqliteConnection::Run(const char* sql) {
+    const int code = sqlite3_exec(database_.get(), sql, nullptr, nullptr, nullptr);
+    return code == SQLITE_OK ? Status() : Failure(database_.get(), code);
+}
+
+std::string SqliteConnection::Text(const char* sql) {
+    sqlite3_stmt* compiled = nullptr;
+    sqlite3_prepare_v2(database_.get(), sql, -1, &compiled, nullptr);
+    const StatementHandle statement(compiled);
+    if (!compiled || sqlite3_step(compiled) != SQLITE_ROW) return {};
+    const auto* text = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
+    return text ? text : "";
+}
+
+}  // namespace engine::sqlite

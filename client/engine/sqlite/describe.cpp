@@ -1,0 +1,114 @@
+#include "engine/sqlite/describe.h"
+
+#include <algorithm>
+#include <cctype>
+
+#include "engine/sqlite/column_types.h"
+#include "engine/sqlite/select_list.h"
+#include "engine/sqlite/stored_number.h"
+#include "oci.h"
+
+namespace engine::sqlite {
+namespace {
+
+constexpr std::int8_t kFloating = -127;
+constexpr std::uint32_t kNumberSize = 22;
+constexpr std::uint32_t kRowIdSize = 18;
+
+bool EqualsWord(std::string_view word, std::string_view lower) {
+    return std::equal(word.begin(), word.end(), lower.begin(), lower.end(),
+                      [](char a, char b) { return std::tolower(static_cast<unsigned char>(a)) == b; });
+}
+
+void MakeNumber(Column& column) {
+    column.type = SQLT_NUM;
+    column.size = kNumberSize;
+    column.precision = 0;
+    column.scale = kFloating;
+}
+
+// Names that were not quoted are shown in upper case. A name that stands quoted in the statement was.
+std::string ShownName(std::string_view name, std::string_view sql) {
+    if (sql.find('"' + std::string(name) + '"') != std::string_view::npos) return std::string(name);
+    std::string shown(name);
+    char quote = '\0';
+    for (char& c : shown) {
+        if (quote != '\0') {
+            if (c == quote) quote = '\0';
+        } else if (c == '\'' || c == '"') {
+            quote = c;
+        } else {
+            c = static_cast<char>(c >= 'a' && c <= 'z' ? c - 'a' + 'A' : c);
+        }
+    }
+    return shown;
+}
+
+bool IsNullable(sqlite3* database, sqlite3_stmt* statement, int index) {
+    const char* table = sqlite3_column_table_name(statement, index);
+    const char* origin = sqlite3_column_origin_name(statement, index);
+    if (!table || !origin) return true;
+    int not_null = 0;
+    int primary_key = 0;
+    sqlite3_table_column_metadata(database, sqlite3_column_database_name(statement, index), table, origin, nullptr, nullptr,
+                                  &not_null, &primary_key, nullptr);
+    return not_null == 0 && primary_key == 0;
+}
+
+void DescribeItem(const SelectItem& item, Column& column, bool& typed) {
+    if (item.is_row_id) {
+        column.type = SQLT_RDD;
+        column.size = kRowIdSize;
+        column.precision = 0;
+        column.scale = 0;
+        column.nullable = false;
+        typed = true;
+    } else if (!item.cast_type.empty()) {
+        typed = ReadDeclaredType(item.cast_type, column);
+    }
+}
+
+}  // namespace
+
+Verb VerbOf(std::string_view sql) {
+    const std::string_view word = FirstWord(sql);
+    if (EqualsWord(word, "insert") || EqualsWord(word, "replace")) return Verb::insert;
+    if (EqualsWord(word, "update")) return Verb::update;
+    if (EqualsWord(word, "delete")) return Verb::remove;
+    return Verb::other;
+}
+
+void DescribeColumns(sqlite3* database, sqlite3_stmt* statement, std::string_view sql, std::vector<Column>& columns,
+                     std::vector<bool>& untyped) {
+    const int count = sqlite3_column_count(statement);
+    const std::vector<SelectItem> items = ReadSelectList(sql);
+    const bool listed = items.size() == static_cast<std::size_t>(count);
+    for (int index = 0; index < count; ++index) {
+        Column column;
+        column.name = ShownName(sqlite3_column_name(statement, index), sql);
+        const char* declared = sqlite3_column_decltype(statement, index);
+        bool typed = declared && ReadDeclaredType(declared, column);
+        column.nullable = IsNullable(database, statement, index);
+        if (listed) DescribeItem(items[static_cast<std::size_t>(index)], column, typed);
+        columns.push_back(std::move(column));
+        untyped.push_back(!typed);
+    }
+}
+
+void DescribeValue(sqlite3_value* value, Column& column) {
+    switch (sqlite3_value_type(value)) {
+        case SQLITE_INTEGER:
+        case SQLITE_FLOAT: return MakeNumber(column);
+        case SQLITE_BLOB: {
+            OCINumber number;
+            const std::string_view bytes(static_cast<const char*>(sqlite3_value_blob(value)),
+                                         static_cast<std::size_t>(sqlite3_value_bytes(value)));
+            if (ReadNumberBlob(bytes, number)) return MakeNumber(column);
+            column.type = SQLT_BIN;
+            return;
+        }
+        default: column.type = SQLT_CHR;
+    }
+}
+
+}  // namespace engine::sqlite

@@ -1,0 +1,21 @@
+// SQLite's result codes as published error numbers, with its own words.
+#pragma once
+
+#include <sqlite3.h>
+
+#include <cstdint>
+#include <string_view>
+
+#include "handles/status.h"
+
+namespace engine::sqlite {
+
+enum class Verb : std::uint8_t { other, insert, update, remove };    // what a statement does to rows
+
+// The status of a call that has just failed on the database.
+Status Failure(sqlite3* database, int code, Verb verb = Verb::other);
+
+// The status of a result code that has no database behind it.
+Status Failure(int code, std::string_view words);
+
+}  // namespace engine::sqlite

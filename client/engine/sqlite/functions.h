@@ -1,0 +1,32 @@
+// The SQL functions that this engine adds: casts that SQLite would do another way, and the time with its zone.
+#pragma once
+
+#include <sqlite3.h>
+
+#include "engine/engine.h"
+
+namespace engine::sqlite {
+
+// Casts by functions that keep every digit of a number and the text form of dates. Of two types that begin with the same
+// word the longer stands first.
+inline constexpr Dialect::Spelling kCasts[] = {
+    {"decfloat", "kelp_decfloat"},
+    {"number", "kelp_number"},
+    {"numeric", "kelp_number"},
+    {"decimal", "kelp_number"},
+    {"dec", "kelp_number"},
+    {"varchar2", "kelp_varchar"},
+    {"varchar", "kelp_varchar"},
+    {"nvarchar2", "kelp_varchar"},
+    {"character varying", "kelp_varchar"},
+    {"char varying", "kelp_varchar"},
+    {"character", "kelp_char"},
+    {"nchar", "kelp_char"},
+    {"char", "kelp_char"},
+    {"date", "kelp_date"},
+    {"timestamp", "kelp_timestamp"},
+};
+
+Status AddFunctions(sqlite3* database);
+
+}  // namespace engine::sqlite

@@ -1,0 +1,20 @@
+// The select list of a statement's text, as far as SQLite does not tell what an expression is: row ids and casts.
+#pragma once
+
+#include <string_view>
+#include <vector>
+
+namespace engine::sqlite {
+
+struct SelectItem {
+    bool is_row_id = false;
+    std::string_view cast_type;    // of an expression that is wholly a cast: its type; a view of the text
+};
+
+// One item a column; none when the text is no query whose list can be told, as with "*".
+std::vector<SelectItem> ReadSelectList(std::string_view sql);
+
+// The first word behind blanks, comments and parentheses.
+std::string_view FirstWord(std::string_view sql);
+
+}  // namespace engine::sqlite

@@ -1,0 +1,14 @@
+// The embedded engine.
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include "engine/engine.h"
+
+namespace engine::sqlite {
+
+// Opens a database file, made when missing, or ":memory:".
+Status Connect(const std::string& file, std::unique_ptr<Connection>& connection);
+
+}  // namespace engine::sqlite

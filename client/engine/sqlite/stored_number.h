@@ -1,0 +1,30 @@
+// How numbers lie in a database: an integer when the value is one and fits 64 bits, a real when it has at most 15
+// significant digits, else a blob: four bytes that mark it, then the number's bytes without the leading count. Blobs of
+// numbers sort as the numbers do, but behind all integers and reals, and SQL cannot compute with them.
+#pragma once
+
+#include <sqlite3.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+#include "oci.h"
+
+namespace engine::sqlite {
+
+struct StoredNumber {
+    enum class Form : std::uint8_t { null, integer, real, blob };
+    Form form = Form::null;    // null: bytes that are no number
+    std::uint8_t length = 0;
+    std::int64_t integer = 0;
+    double real = 0;
+    unsigned char blob[4 + OCI_NUMBER_SIZE];
+
+    static StoredNumber From(const OCINumber& number);
+};
+
+// Reads a blob back; false when it is not one of a number.
+bool ReadNumberBlob(std::string_view blob, OCINumber& number);
+
+}  // namespace engine::sqlite
