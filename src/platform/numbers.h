@@ -1,0 +1,15 @@
+// Reading decimal numbers: optional leading blanks and sign, then digits up to the first other character; 0 when there are
+// none or the text is null. A number out of range is the nearest one in range. Also a sleep.
+#pragma once
+
+#include <cstdint>
+
+std::int64_t StrToInt64(const char* text);
+// A minus sign is read modulo 2^64, as C reads unsigned numbers: "-1" is the largest one.
+std::uint64_t StrToUint64(const char* text);
+
+std::int32_t AtoiRules(const char* text);
+std::int64_t AtolRules(const char* text);
+
+// Returns at once for 0 and below; a signal does not shorten it.
+void SleepMilliseconds(std::int64_t milliseconds);
