@@ -45,6 +45,11 @@ inline constexpr KeywordTable FileSeekKeywords[] = {
     {"oci_file_seek_beginning", 1}, {"oci_file_seek_current", 2}, {"oci_file_seek_end", 3},
     kEndOfKeywords};
 
+// OCIFileSeek: directions.
+inline constexpr KeywordTable FileDirectionKeywords[] = {
+    {"oci_file_forward", 1}, {"oci_file_backward", 2},
+    kEndOfKeywords};
+
 // OCIFileOpen: create flags.
 inline constexpr KeywordTable FileCreateKeywords[] = {
     {"oci_file_truncate", 4}, {"oci_file_exist", 0}, {"oci_file_excl", 2}, {"oci_file_create", 1},

@@ -140,6 +140,12 @@ bool TextArgument::Set(const char* word, long length, TextArea area) {
     return Pass(word);
 }
 
+bool TextArgument::SetBytes(const char* word, long length) {
+    text_ = nullptr;
+    length_ = static_cast<uint32_t>(length);
+    return word == nullptr || Pass(word);
+}
+
 // Words lie in token buffers. A length beyond those gets a block of its own, unless only the library can refuse it.
 bool TextArgument::Pass(const char* word) {
     const char* readable = word;

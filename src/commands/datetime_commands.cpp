@@ -1,0 +1,135 @@
+// The commands on datetimes, which are named descriptors. All take an environment and an error handle first.
+#include "commands/date_values.h"
+#include "commands/families.h"
+#include "commands/word_arguments.h"
+
+namespace {
+
+enum Code {
+    kAssign = 293, kCheck = 294, kCompare = 295, kConstruct = 296, kGetDate = 331, kGetTime = 332, kSetDate = 333,
+    kSetTime = 334
+};
+
+OCIDateTime* FindDateTime(const char* word) {
+    return Resolve<OCIDateTime>(Kind::datetime, word);
+}
+
+void RunAssign(int, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const from = FindDateTime(words[3]);
+    OCIDateTime* const to = FindDateTime(words[4]);
+    const sword rc = Call(&ClientLibrary::OCIDateTimeAssignNS, handles.environment, handles.error, from, to);
+    TraceAndReport(kAssign, handles.error, rc);
+    if (rc == OCI_SUCCESS) PrintDateTime(to);
+}
+
+void RunCheck(int count, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const datetime = FindDateTime(words[3]);
+    ResultPlace<uword> flags(count, words, 4);
+    const sword rc = Call(&ClientLibrary::OCIDateTimeCheckNS, handles.environment, handles.error, datetime,
+                          flags.Pointer());
+    Conclude(kCheck, handles.error, rc, flags);
+}
+
+void RunCompare(int count, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const left = FindDateTime(words[3]);
+    OCIDateTime* const right = FindDateTime(words[4]);
+    ResultPlace<int> result(count, words, 5);
+    const sword rc = Call(&ClientLibrary::OCIDateTimeCompareNS, handles.environment, handles.error, left, right,
+                          result.Pointer());
+    Conclude(kCompare, handles.error, rc, result);
+}
+
+void RunConstruct(int, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const datetime = FindDateTime(words[3]);
+    TextArgument zone;
+    if (!SetTextWords(zone, words + 11)) return;
+    const sword rc = Call(&ClientLibrary::OCIDateTimeConstructNS, handles.environment, handles.error, datetime,
+                          static_cast<sb2>(DecodeNumber(words[4])), static_cast<ub1>(DecodeNumber(words[5])),
+                          static_cast<ub1>(DecodeNumber(words[6])), static_cast<ub1>(DecodeNumber(words[7])),
+                          static_cast<ub1>(DecodeNumber(words[8])), static_cast<ub1>(DecodeNumber(words[9])),
+                          static_cast<ub4>(DecodeNumber(words[10])), zone.Text(), zone.Length());
+    TraceAndReport(kConstruct, handles.error, rc);
+    if (rc == OCI_SUCCESS) PrintDateTime(datetime);
+}
+
+void RunGetDate(int count, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const datetime = FindDateTime(words[3]);
+    sb2 year = 0;
+    ub1 month = 0;
+    ub1 day = 0;
+    const sword rc = Call(&ClientLibrary::OCIDateTimeGetDateNS, handles.environment, handles.error, datetime,
+                          Place(year, count, words, 4), Place(month, count, words, 5), Place(day, count, words, 6));
+    TraceAndReport(kGetDate, handles.error, rc);
+    if (rc == OCI_SUCCESS) Message(kOutput, "year-%d, month-%d, day-%d\n", year, month, day);
+}
+
+struct TimeOfDay {
+    ub1 hour = 0;
+    ub1 minute = 0;
+    ub1 second = 0;
+    ub4 fraction = 0;
+};
+
+void RunGetTime(int count, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const datetime = FindDateTime(words[3]);
+    TimeOfDay time;
+    const sword rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, handles.environment, handles.error, datetime,
+                          Place(time.hour, count, words, 4), Place(time.minute, count, words, 5),
+                          Place(time.second, count, words, 6), Place(time.fraction, count, words, 7));
+    TraceAndReport(kGetTime, handles.error, rc);
+    if (rc != OCI_SUCCESS) return;
+    Message(kOutput, "hour-%d, minute-%d, second-%d, fraction-%d\n", time.hour, time.minute, time.second,
+            static_cast<int>(time.fraction));
+}
+
+void RunSetDate(int, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const datetime = FindDateTime(words[3]);
+    const sword rc = Call(&ClientLibrary::OCI_datetimeSetDate, handles.environment, handles.error, datetime,
+                          static_cast<sb2>(DecodeNumber(words[4])), static_cast<ub1>(DecodeNumber(words[5])),
+                          static_cast<ub1>(DecodeNumber(words[6])));
+    TraceAndReport(kSetDate, handles.error, rc);
+    if (rc == OCI_SUCCESS) PrintDateTime(datetime);
+}
+
+// What was set is read back and printed, in a form that differs from that of getting in its blanks.
+void RunSetTime(int, char** words) {
+    const Handles handles(words);
+    OCIDateTime* const datetime = FindDateTime(words[3]);
+    sword rc = Call(&ClientLibrary::OCI_datetimeSetTime, handles.environment, handles.error, datetime,
+                    static_cast<ub1>(DecodeNumber(words[4])), static_cast<ub1>(DecodeNumber(words[5])),
+                    static_cast<ub1>(DecodeNumber(words[6])), static_cast<ub4>(DecodeNumber(words[7])));
+    TraceAndReport(kSetTime, handles.error, rc);
+    if (rc != OCI_SUCCESS) return;
+    TimeOfDay time;
+    rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, handles.environment, handles.error, datetime, &time.hour,
+              &time.minute, &time.second, &time.fraction);
+    if (rc != OCI_SUCCESS) return ReturnCodeReport(handles.error, rc);
+    Message(kOutput, "hour - %d, minute - %d, second - %d, fraction - %d\n", time.hour, time.minute, time.second,
+            static_cast<int>(time.fraction));
+}
+
+constexpr PlainCommand kDateTimeCommands[] = {
+    {{kAssign, Words(5), "OCIDateTimeAssign hEnv hError from to"}, RunAssign},
+    {{kCheck, WordsBetween(4, 5), "OCIDateTimeCheck hEnv hError date [valid]"}, RunCheck},
+    {{kCompare, WordsBetween(5, 6), "OCIDateTimeCompare hEnv hError date1 date2 [result]"}, RunCompare},
+    {{kConstruct, Words(13),
+      "OCIDateTimeConstruct hEnv hError hDate year month day hour min sec frac timezone timezone_len"},
+     RunConstruct},
+    {{kGetDate, Words(4, 7), "OCIDateTimeGetDate hEnv hError hDate [year month day]"}, RunGetDate},
+    {{kGetTime, Words(4, 8), "OCIDateTimeGetTime hEnv hError hDate [hour minute second fraction]"}, RunGetTime},
+    {{kSetDate, Words(7), "OCIDateTimeSetDate hEnv hError hDate year month day"}, RunSetDate},
+    {{kSetTime, Words(8), "OCIDateTimeSetTime hEnv hError hDate hour min sec frac"}, RunSetTime},
+};
+
+}  // namespace
+
+void AddDateTimeCommands(HandlerTable& handlers) {
+    handlers.Add(kDateTimeCommands);
+}

@@ -1,0 +1,161 @@
+// The commands of the library's file package.
+#include <algorithm>
+
+#include "commands/families.h"
+#include "commands/word_arguments.h"
+#include "core/messages.h"
+#include "objects/memory.h"
+#include "objects/registry.h"
+#include "platform/client_library.h"
+#include "report/return_code.h"
+#include "report/trace.h"
+
+namespace {
+
+enum Code { kOpen = 276, kRead = 277, kSeek = 278, kWrite = 280 };
+
+OCIFileObject* FindFile(const char* word) {
+    return Resolve<OCIFileObject>(Kind::file, word);
+}
+
+void TraceAndReport(int code, const Handles& handles, sword rc, const char* name) {
+    outputOCI(code, rc, name);
+    ReturnCodeReport(handles.error, rc);
+}
+
+// --- The package ------------------------------------------------------------------------------------------------------
+
+struct PackageCommand : CommandRow {
+    LibraryFunction<sword(void*, OCIError*)> ClientLibrary::*function;
+};
+constexpr PackageCommand kPackageCommands[] = {
+    {{275, Words(3), "OCIFileInit hEnv hError"}, &ClientLibrary::OCIFileInit},
+    {{279, Words(3), "OCIFileTerm hEnv hError"}, &ClientLibrary::OCIFileTerm},
+};
+void RunPackage(const PackageCommand& row, int, char** words) {
+    const Handles handles(words);
+    TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error), "");
+}
+
+// --- An open file -----------------------------------------------------------------------------------------------------
+
+struct FileCommand : CommandRow {
+    LibraryFunction<sword(void*, OCIError*, OCIFileObject*)> ClientLibrary::*function;
+    bool frees_name;
+};
+constexpr FileCommand kFileCommands[] = {
+    {{271, Words(4), "OCIFileClose hEnv hError hFile"}, &ClientLibrary::OCIFileClose, true},
+    {{273, Words(4), "OCIFileFlush hEnv hError hFile"}, &ClientLibrary::OCIFileFlush, false},
+};
+void RunFile(const FileCommand& row, int, char** words) {
+    const Handles handles(words);
+    OCIFileObject* const file = FindFile(words[3]);
+    const sword rc = Call(row.function, handles.environment, handles.error, file);
+    TraceAndReport(row.code, handles, rc, words[3]);
+    if (rc == OCI_SUCCESS && row.frees_name) Release(Kind::file, words[3]);
+}
+
+void RunOpen(int, char** words) {
+    const char* const name = words[3];
+    const Handles handles(words);
+    if (CheckInUse(Kind::file, name)) return;
+    TextArgument file_name;
+    TextArgument path;
+    if (!SetClosedText(file_name, words[4]) || !SetClosedText(path, words[5])) return;
+    const ub4 mode = static_cast<ub4>(DecodeKeywordOrNumber(words[6], FileOpenModeKeywords));
+    const ub4 create = static_cast<ub4>(DecodeKeywordOrNumber(words[7], FileCreateKeywords));
+    const ub4 type = static_cast<ub4>(DecodeKeywordOrNumber(words[8], FileStdKeywords));
+    OCIFileObject* file = nullptr;
+    OCIFileObject** const place = NewPlace(file, name);
+    const sword rc = Call(&ClientLibrary::OCIFileOpen, handles.environment, handles.error, place, file_name.Text(),
+                          path.Text(), mode, create, type);
+    TraceAndReport(kOpen, handles, rc, name);
+    if (rc == OCI_SUCCESS && place != nullptr) Register(Kind::file, name, file, handles.environment);
+}
+
+// Read in one go, at most this much: a larger length, or one below 0, is cut to it.
+constexpr ub4 kLargestRead = 16u << 20;
+
+void RunRead(int count, char** words) {
+    const Handles handles(words);
+    OCIFileObject* const file = FindFile(words[3]);
+    const ub4 length = std::min(static_cast<ub4>(DecodeNumber(words[4])), kLargestRead);
+    const Memory<char> area(static_cast<char*>(GetMem(length)));
+    if (area == nullptr) return;
+    char* const buffer = Place(*area, count, words, 5);
+    ub4 bytes_read = 0;
+    ub4* const bytes_read_place = Place(bytes_read, count, words, 6);
+    const sword rc = Call(&ClientLibrary::OCIFileRead, handles.environment, handles.error, file, buffer, length,
+                          bytes_read_place);
+    TraceAndReport(kRead, handles, rc, words[3]);
+    if (rc != OCI_SUCCESS || bytes_read_place == nullptr) return;
+    Message(kOutput, "Bytes read - %u\n", bytes_read);
+    if (buffer == nullptr) return;
+    Line line;
+    line.Text({buffer, std::min(bytes_read, length)}).Character('\n').Print();
+}
+
+void RunWrite(int count, char** words) {
+    const Handles handles(words);
+    OCIFileObject* const file = FindFile(words[3]);
+    TextArgument data;
+    if (!data.SetBytes(words[4], DecodeLong(words[5]))) return;  // "null" is data like any other
+    ub4 bytes_written = 0;
+    ub4* const bytes_written_place = Place(bytes_written, count, words, 6);
+    const sword rc = Call(&ClientLibrary::OCIFileWrite, handles.environment, handles.error, file, data.Text(),
+                          data.Length(), bytes_written_place);
+    TraceAndReport(kWrite, handles, rc, words[3]);
+    if (rc == OCI_SUCCESS && bytes_written_place != nullptr) Message(kOutput, "Bytes written - %u\n", bytes_written);
+}
+
+// Unknown words for origin and direction reach the library as what stands for "not found", cut to the argument's width.
+void RunSeek(int, char** words) {
+    const Handles handles(words);
+    OCIFileObject* const file = FindFile(words[3]);
+    const uword origin = static_cast<uword>(DecodeKeyword(words[4], FileSeekKeywords));
+    const ubig_ora offset = static_cast<ubig_ora>(DecodeLong(words[5]));
+    const sb1 direction = static_cast<sb1>(DecodeKeyword(words[6], FileDirectionKeywords));
+    const sword rc = Call(&ClientLibrary::OCIFileSeek, handles.environment, handles.error, file, origin, offset,
+                          direction);
+    TraceAndReport(kSeek, handles, rc, words[3]);
+}
+
+// --- A file by its name -----------------------------------------------------------------------------------------------
+
+template <class Answer> struct NamedFileCommand : CommandRow {
+    LibraryFunction<sword(void*, OCIError*, OraText*, OraText*, Answer*)> ClientLibrary::*function;
+};
+constexpr NamedFileCommand<ub1> kExistenceCommands[] = {
+    {{272, WordsBetween(5, 6), "OCIFileExists hEnv hError filename path [flag]"}, &ClientLibrary::OCIFileExists},
+};
+constexpr NamedFileCommand<ubig_ora> kLengthCommands[] = {
+    {{274, WordsBetween(5, 6), "OCIFileGetLength hEnv hError filename path [plen]"}, &ClientLibrary::OCIFileGetLength},
+};
+template <class Answer> void RunNamedFile(const NamedFileCommand<Answer>& row, int count, char** words) {
+    const Handles handles(words);
+    TextArgument name;
+    TextArgument path;
+    if (!SetClosedText(name, words[3]) || !SetClosedText(path, words[4])) return;
+    Answer answer = 0;
+    Answer* const place = Place(answer, count, words, 5);
+    const sword rc = Call(row.function, handles.environment, handles.error, name.Text(), path.Text(), place);
+    TraceAndReport(row.code, handles, rc, "");
+    if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "%ld\n", static_cast<long>(answer));
+}
+
+constexpr PlainCommand kOtherFileCommands[] = {
+    {{kOpen, Words(9), "OCIFileOpen hEnv hError hFile filename path mode create type"}, RunOpen},
+    {{kRead, Words(5, 7), "OCIFileRead hEnv hError hFile bufl [buffer bytesread]"}, RunRead},
+    {{kWrite, WordsBetween(6, 7), "OCIFileWrite hEnv hError hFile data datalen [byteswritten]"}, RunWrite},
+    {{kSeek, Words(7), "OCIFileSeek hEnv hError hFile origin offset dir"}, RunSeek},
+};
+
+}  // namespace
+
+void AddFileCommands(HandlerTable& handlers) {
+    handlers.Add<RunPackage>(kPackageCommands);
+    handlers.Add<RunFile>(kFileCommands);
+    handlers.Add<RunNamedFile<ub1>>(kExistenceCommands);
+    handlers.Add<RunNamedFile<ubig_ora>>(kLengthCommands);
+    handlers.Add(kOtherFileCommands);
+}

@@ -1,0 +1,256 @@
+// The commands of the library's thread package. Its objects (mutexes, keys, thread identifiers, thread handles) are named
+// alike, so a row and the type of its function say what a command does.
+#include <cstring>
+
+#include "commands/families.h"
+#include "commands/thread_child.h"
+#include "commands/word_arguments.h"
+#include "core/messages.h"
+#include "core/state.h"
+#include "objects/registry.h"
+#include "platform/client_library.h"
+#include "report/return_code.h"
+#include "report/trace.h"
+
+namespace {
+
+enum Code {
+    kProcessInit = 377, kIsMulti = 382, kKeyInit = 385, kKeySet = 387, kKeyGet = 388, kIdNull = 391, kIdSame = 393,
+    kIdSet = 395, kCreate = 399
+};
+
+template <class Object> constexpr Kind kKind = Kind::mutex;
+template <> constexpr Kind kKind<OCIThreadKey> = Kind::key;
+template <> constexpr Kind kKind<OCIThreadId> = Kind::tid;
+template <> constexpr Kind kKind<OCIThreadHandle> = Kind::thnd;
+
+template <class Object> Object* Find(const char* word) {
+    return Resolve<Object>(kKind<Object>, word);
+}
+
+void TraceAndReport(int code, const Handles& handles, sword rc, const char* name) {
+    outputOCI(code, rc, name);
+    ReturnCodeReport(handles.error, rc);
+}
+
+// --- The process and the package --------------------------------------------------------------------------------------
+
+void RunProcessInit(int, char**) {
+    Call(&ClientLibrary::OCIThreadProcessInit);
+    outputOCI(kProcessInit, OCI_SUCCESS, "");
+    Message(kOutput, "OCIThreadProcessInit called\n");
+}
+
+void RunIsMulti(int, char**) {
+    const boolean is_multi = Call(&ClientLibrary::OCIThreadIsMulti);
+    outputOCI(kIsMulti, OCI_SUCCESS, "");
+    Message(kOutput, "OCIThreadIsMulti %d\n", is_multi);
+}
+
+struct PackageCommand : CommandRow {
+    LibraryFunction<sword(void*, OCIError*)> ClientLibrary::*function;
+};
+constexpr PackageCommand kPackageCommands[] = {
+    {{383, Words(3), "OCIThreadInit hEnv hError"}, &ClientLibrary::OCIThreadInit},
+    {{384, Words(3), "OCIThreadTerm hEnv hError"}, &ClientLibrary::OCIThreadTerm},
+};
+void RunPackage(const PackageCommand& row, int, char** words) {
+    const Handles handles(words);
+    TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error), words[1]);
+}
+
+// --- Making and destroying named objects ------------------------------------------------------------------------------
+
+template <class Object> struct Making : CommandRow {
+    LibraryFunction<sword(void*, OCIError*, Object**)> ClientLibrary::*function;
+};
+constexpr Making<OCIThreadMutex> kMutexMaking[] = {
+    {{378, Words(4), "OCIThreadMutexInit hEnv hError mutex"}, &ClientLibrary::OCIThreadMutexInit},
+};
+constexpr Making<OCIThreadId> kIdMaking[] = {
+    {{389, Words(4), "OCIThreadIdInit hEnv hError tid"}, &ClientLibrary::OCIThreadIdInit},
+};
+constexpr Making<OCIThreadHandle> kHandleMaking[] = {
+    {{396, Words(4), "OCIThreadHndInit hEnv hError thnd"}, &ClientLibrary::OCIThreadHndInit},
+};
+
+// `make` is the call, given the handles and the place of the new object.
+template <class Object, class Function> void Make(int code, char** words, Function make) {
+    const Handles handles(words);
+    const char* const name = words[3];
+    if (CheckInUse(kKind<Object>, name)) return;
+    Object* object = nullptr;
+    Object** const place = NewPlace(object, name);
+    const sword rc = make(handles, place);
+    TraceAndReport(code, handles, rc, name);
+    if (rc == OCI_SUCCESS && place != nullptr) Register(kKind<Object>, name, object, handles.environment);
+}
+template <class Object> void RunMaking(const Making<Object>& row, int, char** words) {
+    Make<Object>(row.code, words, [&](const Handles& handles, Object** place) {
+        return Call(row.function, handles.environment, handles.error, place);
+    });
+}
+// A fifth word, whatever it is, installs the destructor.
+void RunKeyInit(int count, char** words) {
+    const OCIThreadKeyDestFunc destructor = count == 5 ? MyThreadKeyDescructor : nullptr;
+    Make<OCIThreadKey>(kKeyInit, words, [=](const Handles& handles, OCIThreadKey** place) {
+        return Call(&ClientLibrary::OCIThreadKeyInit, handles.environment, handles.error, place, destructor);
+    });
+}
+
+template <class Object> struct Destroying : Making<Object> {};
+constexpr Destroying<OCIThreadMutex> kMutexDestroying[] = {
+    {{{379, Words(4), "OCIThreadMutexDestroy hEnv hError mutex"}, &ClientLibrary::OCIThreadMutexDestroy}},
+};
+constexpr Destroying<OCIThreadKey> kKeyDestroying[] = {
+    {{{386, Words(4), "OCIThreadKeyDestroy hEnv hError key"}, &ClientLibrary::OCIThreadKeyDestroy}},
+};
+constexpr Destroying<OCIThreadId> kIdDestroying[] = {
+    {{{390, Words(4), "OCIThreadIdDestroy hEnv hError tid"}, &ClientLibrary::OCIThreadIdDestroy}},
+};
+constexpr Destroying<OCIThreadHandle> kHandleDestroying[] = {
+    {{{397, Words(4), "OCIThreadHndDestroy hEnv hError thnd"}, &ClientLibrary::OCIThreadHndDestroy}},
+};
+template <class Object> void RunDestroying(const Destroying<Object>& row, int, char** words) {
+    const Handles handles(words);
+    Object* object = Find<Object>(words[3]);
+    const sword rc = Call(row.function, handles.environment, handles.error, &object);
+    TraceAndReport(row.code, handles, rc, words[3]);
+    if (rc == OCI_SUCCESS) Release(kKind<Object>, words[3]);
+}
+
+// --- Using one object -------------------------------------------------------------------------------------------------
+
+template <class Object> struct Use : CommandRow {
+    LibraryFunction<sword(void*, OCIError*, Object*)> ClientLibrary::*function;
+};
+constexpr Use<OCIThreadMutex> kMutexUses[] = {
+    {{380, Words(4), "OCIThreadMutexAcquire hEnv hError mutex"}, &ClientLibrary::OCIThreadMutexAcquire},
+    {{381, Words(4), "OCIThreadMutexRelease hEnv hError mutex"}, &ClientLibrary::OCIThreadMutexRelease},
+};
+constexpr Use<OCIThreadId> kIdUses[] = {
+    {{392, Words(4), "OCIThreadIdGet hEnv hError tid"}, &ClientLibrary::OCIThreadIdGet},
+    {{394, Words(4), "OCIThreadIdSetNull hEnv hError tid"}, &ClientLibrary::OCIThreadIdSetNull},
+};
+constexpr Use<OCIThreadHandle> kHandleUses[] = {
+    {{398, Words(4), "OCIThreadHandleGet hEnv hError thnd"}, &ClientLibrary::OCIThreadHandleGet},
+    {{400, Words(4), "OCIThreadClose hEnv hError thnd"}, &ClientLibrary::OCIThreadClose},
+    {{401, Words(4), "OCIThreadJoin hEnv hError thnd"}, &ClientLibrary::OCIThreadJoin},
+};
+template <class Object> void RunUse(const Use<Object>& row, int, char** words) {
+    const Handles handles(words);
+    Object* const object = Find<Object>(words[3]);
+    TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error, object), words[3]);
+}
+
+// --- Values of keys ---------------------------------------------------------------------------------------------------
+
+struct KeyText {
+    char text[80];
+};
+
+// Where a key's text lies: in its slot, since the library hands it out until the key is set anew. Keys without a name share
+// one place.
+KeyText& KeyTextOf(const char* key) {
+    static KeyText unnamed;
+    const NamedObject* const slot = FindByName(Kind::key, key);
+    return slot == nullptr || slot->area == nullptr ? unnamed : *reinterpret_cast<KeyText*>(slot->area);
+}
+
+// A call that fails leaves the key its old text.
+void RunKeySet(int, char** words) {
+    const Handles handles(words);
+    OCIThreadKey* const key = Find<OCIThreadKey>(words[3]);
+    KeyText& place = KeyTextOf(words[3]);
+    const KeyText old = place;
+    if (!IsNull(words[4])) std::strncpy(place.text, words[4], sizeof place.text - 1);
+    const sword rc = Call(&ClientLibrary::OCIThreadKeySet, handles.environment, handles.error, key,
+                          IsNull(words[4]) ? nullptr : place.text);
+    if (rc != OCI_SUCCESS) place = old;
+    TraceAndReport(kKeySet, handles, rc, words[3]);
+}
+
+void RunKeyGet(int count, char** words) {
+    const Handles handles(words);
+    OCIThreadKey* const key = Find<OCIThreadKey>(words[3]);
+    void* value = nullptr;
+    void** const place = Place(value, count, words, 4);
+    const sword rc = Call(&ClientLibrary::OCIThreadKeyGet, handles.environment, handles.error, key, place);
+    TraceAndReport(kKeyGet, handles, rc, words[3]);
+    if (rc != OCI_SUCCESS || place == nullptr) return;
+    Message(kOutput, "OCIThreadKeyGet - %s\n", value == nullptr ? "null" : static_cast<const char*>(value));
+}
+
+// --- Thread identifiers -----------------------------------------------------------------------------------------------
+
+void RunIdSet(int, char** words) {
+    const Handles handles(words);
+    auto* const target = Find<OCIThreadId>(words[3]);
+    auto* const source = Find<OCIThreadId>(words[4]);
+    const sword rc = Call(&ClientLibrary::OCIThreadIdSet, handles.environment, handles.error, target, source);
+    TraceAndReport(kIdSet, handles, rc, words[3]);
+}
+
+void RunIdSame(int count, char** words) {
+    const Handles handles(words);
+    auto* const left = Find<OCIThreadId>(words[3]);
+    auto* const right = Find<OCIThreadId>(words[4]);
+    boolean same = FALSE;
+    boolean* const place = Place(same, count, words, 5);
+    const sword rc = Call(&ClientLibrary::OCIThreadIdSame, handles.environment, handles.error, left, right, place);
+    TraceAndReport(kIdSame, handles, rc, words[1]);
+    if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "OCIThreadIdSame - %d\n", same);
+}
+
+void RunIdNull(int count, char** words) {
+    const Handles handles(words);
+    auto* const identifier = Find<OCIThreadId>(words[3]);
+    boolean is_null = FALSE;
+    boolean* const place = Place(is_null, count, words, 4);
+    const sword rc = Call(&ClientLibrary::OCIThreadIdNull, handles.environment, handles.error, identifier, place);
+    TraceAndReport(kIdNull, handles, rc, words[3]);
+    if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "OCIThreadIdNull - %d\n", is_null);
+}
+
+// --- Threads ----------------------------------------------------------------------------------------------------------
+
+void RunCreate(int, char** words) {
+    const Handles handles(words);
+    const OCIThreadStartFunction start = IsNull(words[3]) ? nullptr : ChildThread;
+    auto* const key = Find<OCIThreadKey>(words[4]);
+    auto* const identifier = Find<OCIThreadId>(words[5]);
+    auto* const thread = Find<OCIThreadHandle>(words[6]);
+    SetChildHandles(DefaultEnvironment, DefaultErrorHandle);
+    const sword rc = Call(&ClientLibrary::OCIThreadCreate, handles.environment, handles.error, start, key, identifier,
+                          thread);
+    TraceAndReport(kCreate, handles, rc, words[6]);
+}
+
+constexpr PlainCommand kOtherThreadCommands[] = {
+    {{kProcessInit, Words(1), "OCIThreadProcessInit"}, RunProcessInit},
+    {{kIsMulti, Words(1), "OCIThreadIsMulti"}, RunIsMulti},
+    {{kKeyInit, WordsBetween(4, 5), "OCIThreadKeyInit hEnv hError key [destFn]"}, RunKeyInit},
+    {{kKeySet, Words(5), "OCIThreadKeySet hEnv hError key value"}, RunKeySet},
+    {{kKeyGet, WordsBetween(4, 5), "OCIThreadKeyGet hEnv hError key [value]"}, RunKeyGet},
+    {{kIdNull, WordsBetween(4, 5), "OCIThreadIdNull hEnv hError tid [result]"}, RunIdNull},
+    {{kIdSame, WordsBetween(5, 6), "OCIThreadIdSame hEnv hError tid1 tid2 [result]"}, RunIdSame},
+    {{kIdSet, Words(5), "OCIThreadIdSet hEnv hError tidDest tidSrc"}, RunIdSet},
+    {{kCreate, Words(7), "OCIThreadCreate hEnv hError child key tid thnd"}, RunCreate},
+};
+
+}  // namespace
+
+void AddThreadCommands(HandlerTable& handlers) {
+    handlers.Add<RunPackage>(kPackageCommands);
+    handlers.Add<RunMaking<OCIThreadMutex>>(kMutexMaking);
+    handlers.Add<RunMaking<OCIThreadId>>(kIdMaking);
+    handlers.Add<RunMaking<OCIThreadHandle>>(kHandleMaking);
+    handlers.Add<RunDestroying<OCIThreadMutex>>(kMutexDestroying);
+    handlers.Add<RunDestroying<OCIThreadKey>>(kKeyDestroying);
+    handlers.Add<RunDestroying<OCIThreadId>>(kIdDestroying);
+    handlers.Add<RunDestroying<OCIThreadHandle>>(kHandleDestroying);
+    handlers.Add<RunUse<OCIThreadMutex>>(kMutexUses);
+    handlers.Add<RunUse<OCIThreadId>>(kIdUses);
+    handlers.Add<RunUse<OCIThreadHandle>>(kHandleUses);
+    handlers.Add(kOtherThreadCommands);
+}
