@@ -8,58 +8,93 @@ namespace {
 
 // Whether ShiftRight(digits, count) drops a digit that is not 0.
 bool DropsDigits(const Digits& digits, int count) {
-    return count > kUnpackedDigits - CountDigits(digits) && !digits.IsZero();
+    return count > kUnpackedDigits - static_cast<int>(CountDigits(digits)) && !digits.IsZero();
 }
 
-// |larger| + |smaller|. Digits below the guard digits cannot change a rounding half up.
-void AddMagnitudes(Digits* larger, Digits* smaller) {
-    ShiftRight(smaller, larger->exponent - smaller->exponent);
-    std::uint64_t carry = 0;
-    for (int word = 2; word >= 0; --word)
-        larger->words[word] = AddDigits(larger->words[word], smaller->words[word], &carry);
-    if (carry == 0) return;
-    ShiftRight(larger, 1);
-    larger->words[0] |= 1ull << 56;
-    ++larger->exponent;
+// |larger| + |smaller|, with the sign of the larger. Digits below the guard digits cannot change a rounding half up.
+Errno AddMagnitudes(Digits larger, Digits smaller, OCINumber* result) {
+    ShiftRight(&smaller, larger.exponent - smaller.exponent);
+    if (AddInto(&larger, smaller)) PrependOne(&larger);
+    return RoundAndPack(&larger, result);
 }
 
 // |larger| - |smaller|. When digits of the smaller are dropped, the difference is the next lower one: the operands are
 // then so far apart that at most one leading digit cancels, and the guard digits hold what rounding needs.
-void SubtractMagnitudes(Digits* larger, Digits* smaller) {
-    const int shift = larger->exponent - smaller->exponent;
-    std::uint64_t borrow = shift > kUnpackedDigits - kMantissaDigits && DropsDigits(*smaller, shift);
-    ShiftRight(smaller, shift);
-    for (int word = 2; word >= 0; --word)
-        larger->words[word] = SubtractDigits(larger->words[word], smaller->words[word], &borrow);
-    if (larger->words[0] >> 56 == 0) Normalize(larger);
+Errno SubtractMagnitudes(Digits larger, Digits smaller, OCINumber* result) {
+    const int shift = larger.exponent - smaller.exponent;
+    const bool dropped = shift > kUnpackedDigits - kMantissaDigits && DropsDigits(smaller, shift);
+    ShiftRight(&smaller, shift);
+    SubtractFrom(&larger, smaller, dropped);
+    if (larger.words[0] >> 56 == 0) Normalize(&larger);
+    return RoundAndPack(&larger, result);
 }
 
-Errno AddSigned(Digits* a, Digits* b, OCINumber* result) {
-    if (a->negative == b->negative) {
-        if (a->exponent < b->exponent) std::swap(a, b);
-        AddMagnitudes(a, b);
-    } else {
-        if (CompareMagnitude(*a, *b) < 0) std::swap(a, b);
-        SubtractMagnitudes(a, b);
+Errno AddSigned(const Digits& a, const Digits& b, OCINumber* result) {
+    if (a.negative == b.negative)
+        return a.exponent < b.exponent ? AddMagnitudes(b, a, result) : AddMagnitudes(a, b, result);
+    return CompareMagnitude(a, b) < 0 ? SubtractMagnitudes(b, a, result) : SubtractMagnitudes(a, b, result);
+}
+
+// The common case, without a detour through memory: numbers of one sign whose first digits have the same weight, and no
+// rounding. False when it is another case; the result is untouched then.
+template <bool kNegative>
+[[gnu::always_inline]] inline bool AddAligned(const OCINumber& left, const OCINumber& right, OCINumber* result) {
+    Digits a, b;
+    if (!HasMantissa(left) || !HasMantissa(right)) return false;
+    if (Decode<kNegative>(left.OCINumberPart, &a) | Decode<kNegative>(right.OCINumberPart, &b)) return false;
+    unsigned exponent = left.OCINumberPart[1];
+    if (AddInto(&a, b)) {
+        constexpr unsigned kLast = kNegative ? 0 : 255;
+        PrependOne(&a);
+        if (exponent == kLast || (a.words[2] & 0xFFFFFFFFu) != 0) return false;
+        exponent += kNegative ? -1u : 1u;
     }
-    return RoundAndPack(a, result);
+    Encode<kNegative>(a, exponent, result);
+    return true;
+}
+
+// The same for the difference, unless leading digits cancel.
+template <bool kNegative>
+[[gnu::always_inline]] inline bool SubtractAligned(const OCINumber& left, const OCINumber& right, OCINumber* result) {
+    Digits a, b;
+    if (!HasMantissa(left) || !HasMantissa(right)) return false;
+    if (Decode<kNegative>(left.OCINumberPart, &a) | Decode<kNegative>(right.OCINumberPart, &b)) return false;
+    const unsigned exponent = left.OCINumberPart[1];
+    const bool below = SubtractFrom(&a, b);
+    if (below) {
+        b = a;
+        a = Digits{};
+        SubtractFrom(&a, b);
+    }
+    if (a.words[0] >> 56 == 0) return false;
+    if (below) Encode<!kNegative>(a, exponent ^ 0xFF, result);
+    else Encode<kNegative>(a, exponent, result);
+    return true;
 }
 
 }  // namespace
 
 Errno Add(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
+    if (left.OCINumberPart[1] == right.OCINumberPart[1]) {
+        const bool negative = left.OCINumberPart[1] < 128;
+        if (negative ? AddAligned<true>(left, right, result) : AddAligned<false>(left, right, result)) return 0;
+    }
     Digits a, b;
     if (const Errno error = Unpack(left, &a)) return error;
     if (const Errno error = Unpack(right, &b)) return error;
-    return AddSigned(&a, &b, result);
+    return AddSigned(a, b, result);
 }
 
 Errno Sub(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
+    if (left.OCINumberPart[1] == right.OCINumberPart[1]) {
+        const bool negative = left.OCINumberPart[1] < 128;
+        if (negative ? SubtractAligned<true>(left, right, result) : SubtractAligned<false>(left, right, result)) return 0;
+    }
     Digits a, b;
     if (const Errno error = Unpack(left, &a)) return error;
     if (const Errno error = Unpack(right, &b)) return error;
     b.negative = !b.negative;
-    return AddSigned(&a, &b, result);
+    return AddSigned(a, b, result);
 }
 
 }  // namespace number

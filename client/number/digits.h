@@ -28,6 +28,8 @@ struct Digits {
     [[nodiscard]] bool IsZero() const { return words[0] == 0; }
 };
 
+__extension__ using Wide = unsigned __int128;
+
 namespace detail {
 
 constexpr std::uint64_t Repeat(std::uint64_t byte) { return byte * 0x0101010101010101u; }
@@ -35,24 +37,48 @@ constexpr std::uint64_t Repeat(std::uint64_t byte) { return byte * 0x01010101010
 constexpr std::uint8_t kTerminator = 102;  // closes a negative mantissa of fewer than 20 digits
 constexpr std::uint64_t kHighBits = Repeat(0x80);
 
-// By the count of digits: which bytes of the words they fill, and where the terminator stands.
-struct WordTable {
-    std::uint64_t rows[kUnpackedDigits + 1][4] = {};
+// Words with a byte in the place of each of the first `count` digits.
+struct alignas(32) Lanes {
+    std::uint64_t words[4] = {};
 };
-constexpr WordTable MakeMasks() {
-    WordTable table;
-    for (unsigned count = 0; count <= kUnpackedDigits; ++count)
-        for (unsigned i = 0; i < count; ++i) table.rows[count][i / 8] |= 0xFFull << (56 - i % 8 * 8);
+constexpr Lanes Fill(unsigned count, std::uint64_t byte) {
+    Lanes lanes;
+    for (unsigned i = 0; i < count; ++i) lanes.words[i / 8] |= byte << (56 - i % 8 * 8);
+    return lanes;
+}
+
+// What coding needs for a count of digits. A digit d is stored as d + 1, or in a negative number as 101 - d, which is
+// ~(d + 154), with a terminator after the last.
+struct alignas(64) Coding {
+    Lanes mask;
+    Lanes bias;
+};
+struct CodingTable {
+    Coding rows[2][kUnpackedDigits + 1];  // positive, negative
+};
+constexpr CodingTable MakeDecoding() {
+    CodingTable table;
+    for (unsigned count = 0; count <= kUnpackedDigits; ++count) {
+        table.rows[0][count] = {Fill(count, 0xFF), Fill(count, 1)};
+        table.rows[1][count] = {Fill(count, 0xFF), Fill(count, 154)};
+    }
     return table;
 }
-constexpr WordTable MakeTerminators() {
-    WordTable table;
-    for (unsigned count = 0; count < kMantissaDigits; ++count)
-        table.rows[count][count / 8] = std::uint64_t{kTerminator} << (56 - count % 8 * 8);
+struct EncodingTable {
+    Lanes rows[2][kMantissaDigits + 1];
+};
+constexpr EncodingTable MakeEncoding() {
+    EncodingTable table;
+    for (unsigned count = 0; count <= kMantissaDigits; ++count) {
+        table.rows[0][count] = Fill(count, 1);
+        table.rows[1][count] = Fill(count, 101);
+        if (count < kMantissaDigits)
+            table.rows[1][count].words[count / 8] |= std::uint64_t{kTerminator} << (56 - count % 8 * 8);
+    }
     return table;
 }
-inline constexpr WordTable kMasks = MakeMasks();
-inline constexpr WordTable kTerminators = MakeTerminators();
+inline constexpr CodingTable kDecoding = MakeDecoding();
+inline constexpr EncodingTable kEncoding = MakeEncoding();
 
 inline std::uint64_t BigEndian(std::uint64_t word) {
     if constexpr (std::endian::native == std::endian::little) return __builtin_bswap64(word);
@@ -74,21 +100,33 @@ template <class Word> void Store(std::uint8_t* bytes, Word word) {
 
 }  // namespace detail
 
-// a + b + carry, digit by digit; carry is 0 or 1, in and out.
-inline std::uint64_t AddDigits(std::uint64_t a, std::uint64_t b, std::uint64_t* carry) {
-    const std::uint64_t biased = a + detail::Repeat(156);
-    const std::uint64_t sum = biased + b + *carry;
-    const std::uint64_t carried = ((biased & b) | ((biased | b) & ~sum)) & detail::kHighBits;
-    *carry = carried >> 63;
-    return sum - ((~carried & detail::kHighBits) >> 7) * 156;
+// *a += b and *a -= b over all digits, from a carry or borrow of 0 or 1 into the last; answer the one out of the first.
+// The words are added in binary, each digit of *a raised by 156 so that it carries as a digit does. A lane that did not
+// carry is then still raised, at least 156, while one that did is below 100: its high bit tells. A lane that borrowed got
+// 256 where it should have got 100, which its high bit tells as well.
+inline std::uint64_t Lower(std::uint64_t word) { return word - ((word & detail::kHighBits) >> 7) * 156; }
+
+[[gnu::always_inline]] inline std::uint64_t AddInto(Digits* a, const Digits& b, std::uint64_t carry = 0) {
+    const std::uint64_t raise = detail::Repeat(156);
+    const std::uint64_t a2 = a->words[2] + raise, a1 = a->words[1] + raise, a0 = a->words[0] + raise;
+    const std::uint64_t sum2 = a2 + b.words[2] + carry, carry2 = sum2 < a2;
+    const std::uint64_t sum1 = a1 + b.words[1] + carry2, carry1 = sum1 < a1;
+    const std::uint64_t sum0 = a0 + b.words[0] + carry1, carry0 = sum0 < a0;
+    a->words[2] = Lower(sum2);
+    a->words[1] = Lower(sum1);
+    a->words[0] = Lower(sum0);
+    return carry0;
 }
 
-// a - b - borrow, digit by digit; borrow is 0 or 1, in and out.
-inline std::uint64_t SubtractDigits(std::uint64_t a, std::uint64_t b, std::uint64_t* borrow) {
-    const std::uint64_t difference = a - b - *borrow;
-    const std::uint64_t borrowed = ((~a & b) | (~(a ^ b) & difference)) & detail::kHighBits;
-    *borrow = borrowed >> 63;
-    return difference - (borrowed >> 7) * 156;
+[[gnu::always_inline]] inline std::uint64_t SubtractFrom(Digits* a, const Digits& b, std::uint64_t borrow = 0) {
+    const std::uint64_t a2 = a->words[2], a1 = a->words[1], a0 = a->words[0];
+    const std::uint64_t taken2 = b.words[2] + borrow, borrow2 = a2 < taken2;
+    const std::uint64_t taken1 = b.words[1] + borrow2, borrow1 = a1 < taken1;
+    const std::uint64_t taken0 = b.words[0] + borrow1, borrow0 = a0 < taken0;
+    a->words[2] = Lower(a2 - taken2);
+    a->words[1] = Lower(a1 - taken1);
+    a->words[0] = Lower(a0 - taken0);
+    return borrow0;
 }
 
 inline std::uint8_t DigitAt(const Digits& digits, int index) {
@@ -97,11 +135,11 @@ inline std::uint8_t DigitAt(const Digits& digits, int index) {
 }
 
 // Digits up to the last that is not 0.
-inline int CountDigits(const Digits& digits) {
-    if (digits.words[2]) return 24 - std::countr_zero(digits.words[2]) / 8;
-    if (digits.words[1]) return 16 - std::countr_zero(digits.words[1]) / 8;
-    if (digits.words[0]) return 8 - std::countr_zero(digits.words[0]) / 8;
-    return 0;
+[[gnu::always_inline]] inline unsigned CountDigits(const Digits& digits) {
+    const auto trailing = [](std::uint64_t word) { return static_cast<unsigned>(std::countr_zero(word)) / 8; };
+    if (digits.words[2]) return 24 - trailing(digits.words[2]);
+    if (digits.words[1]) return 16 - trailing(digits.words[1]);
+    return digits.words[0] ? 8 - trailing(digits.words[0]) : 0;
 }
 
 // Moves the digits `count` places (0 or more) to the right; those that leave are dropped. The exponent stays.
@@ -145,30 +183,29 @@ inline void Normalize(Digits* digits) {
     digits->exponent -= moved;
 }
 
-// Adds one unit of the digit at `index`; 99...9 becomes 1 with a higher exponent.
-inline void Increment(Digits* digits, int index) {
-    const auto i = static_cast<unsigned>(index);
-    std::uint64_t unit[3] = {};
-    unit[i / 8] = 1ull << (56 - i % 8 * 8);
-    std::uint64_t carry = 0;
-    for (int word = 2; word >= 0; --word)
-        digits->words[word] = AddDigits(digits->words[word], unit[word], &carry);
-    if (carry == 0) return;
+// Sets a 1 in front of the digits: what a carry out of the first one leaves.
+inline void PrependOne(Digits* digits) {
     ShiftRight(digits, 1);
     digits->words[0] |= 1ull << 56;
     ++digits->exponent;
 }
 
-// Keeps the first `count` digits (0 to 24).
-inline void KeepDigits(Digits* digits, int count) {
-    for (int word = 0; word < 3; ++word) digits->words[word] &= detail::kMasks.rows[count][word];
-    if (digits->IsZero()) *digits = Digits{};
+// Adds one unit of the digit at `index`; 99...9 becomes 1 with a higher exponent.
+inline void Increment(Digits* digits, int index) {
+    const auto i = static_cast<unsigned>(index);
+    Digits unit;
+    unit.words[i / 8] = 1ull << (56 - i % 8 * 8);
+    if (DigitAt(*digits, index) != 99) {
+        digits->words[i / 8] += unit.words[i / 8];
+        return;
+    }
+    if (AddInto(digits, unit)) PrependOne(digits);
 }
 
 // Cuts to the 20 digits of a number, half up.
 inline void RoundToMantissa(Digits* digits) {
     const bool up = DigitAt(*digits, kMantissaDigits) >= 50;
-    digits->words[2] &= detail::kMasks.rows[kMantissaDigits][2];
+    digits->words[2] &= ~0xFFFFFFFFull;
     if (up) Increment(digits, kMantissaDigits - 1);
 }
 
@@ -179,63 +216,68 @@ inline bool IsInfinite(const OCINumber& value) {
 }
 
 namespace detail {
-Errno UnpackRare(const OCINumber& value, Digits* digits) noexcept;  // zero, infinities, leading zeros, malformed bytes
+// Zero, infinities, leading zeros, malformed bytes.
+Errno UnpackRare(const OCINumber& value, Digits* digits) noexcept;
+}
+
+inline bool HasMantissa(const OCINumber& value) { return value.OCINumberPart[0] - 2u < kMantissaDigits; }
+
+// Reads the mantissa of a number of that sign, which has 1 to 20 digits; answers 0, or not 0 for all that UnpackRare is
+// for. Written out word by word, and inlined so that the words stay in registers: this is half of an addition.
+template <bool kNegative> [[gnu::always_inline]] inline std::uint64_t Decode(const std::uint8_t* bytes, Digits* digits) {
+    using namespace detail;
+    unsigned count = bytes[0] - 1u;
+    if (kNegative) count -= bytes[1 + count] == kTerminator;
+    constexpr std::uint64_t kInvert = kNegative ? ~0ull : 0;
+    const Coding& coding = kDecoding.rows[kNegative][count];
+    const std::uint64_t* mask = coding.mask.words;
+    const std::uint64_t* bias = coding.bias.words;
+    const std::uint64_t w0 = ((Load<std::uint64_t>(bytes + 2) ^ kInvert) & mask[0]) - bias[0];
+    const std::uint64_t w1 = ((Load<std::uint64_t>(bytes + 10) ^ kInvert) & mask[1]) - bias[1];
+    const std::uint64_t w2 = ((std::uint64_t{Load<std::uint32_t>(bytes + 18)} << 32 ^ kInvert) & mask[2]) - bias[2];
+    digits->words[0] = w0;
+    digits->words[1] = w1;
+    digits->words[2] = w2;
+    digits->exponent = kNegative ? 62 - bytes[1] : bytes[1] - 193;
+    digits->negative = kNegative;
+    // A byte that is no digit leaves a lane above 99, its own or one before; so does a first digit of 0, less 1.
+    return ((w0 - (1ull << 56)) | (w0 + Repeat(28)) | w1 | (w1 + Repeat(28)) | w2 | (w2 + Repeat(28))) & kHighBits;
+}
+
+// Writes normalized digits, of which the last four are 0, as a number of that sign and exponent byte.
+template <bool kNegative> [[gnu::always_inline]] inline void Encode(const Digits& digits, unsigned exponent, OCINumber* result) {
+    using namespace detail;
+    std::uint8_t* bytes = result->OCINumberPart;
+    const unsigned count = CountDigits(digits);
+    const std::uint64_t* bias = kEncoding.rows[kNegative][count].words;
+    const std::uint64_t* w = digits.words;
+    bytes[0] = static_cast<std::uint8_t>(count + 1 + (kNegative && count < kMantissaDigits));
+    bytes[1] = static_cast<std::uint8_t>(exponent);
+    Store(bytes + 2, kNegative ? bias[0] - w[0] : bias[0] + w[0]);
+    Store(bytes + 10, kNegative ? bias[1] - w[1] : bias[1] + w[1]);
+    Store(bytes + 18, static_cast<std::uint32_t>((kNegative ? bias[2] - w[2] : bias[2] + w[2]) >> 32));
 }
 
 // kBadNumber for malformed bytes, kOverflow for an infinity.
 inline Errno Unpack(const OCINumber& value, Digits* digits) noexcept {
-    using namespace detail;
     const std::uint8_t* bytes = value.OCINumberPart;
-    unsigned count = bytes[0] - 1u;
-    if (count - 1u >= kMantissaDigits) return UnpackRare(value, digits);
-    const bool negative = bytes[1] < 128;
-    if (negative) count -= bytes[1 + count] == kTerminator;
-    // Bytes past the end count as the digit 0, whatever they hold. A byte that is no digit leaves its lane above 99.
-    const std::uint64_t(&mask)[4] = kMasks.rows[count];
-    const std::uint64_t none = negative ? Repeat(101) : Repeat(1);
-    const std::uint64_t raw[3] = {(Load<std::uint64_t>(bytes + 2) & mask[0]) | (none & ~mask[0]),
-                                  (Load<std::uint64_t>(bytes + 10) & mask[1]) | (none & ~mask[1]),
-                                  (std::uint64_t{Load<std::uint32_t>(bytes + 18)} << 32 & mask[2]) | (none & ~mask[2])};
-    std::uint64_t wrong = 0;
-    for (int word = 0; word < 3; ++word) {
-        digits->words[word] = negative ? none - raw[word] : raw[word] - none;
-        wrong |= digits->words[word] | (digits->words[word] + Repeat(28));
-    }
-    digits->exponent = negative ? 62 - bytes[1] : bytes[1] - 193;
-    digits->negative = negative;
-    if ((wrong & kHighBits) || digits->words[0] >> 56 == 0) return UnpackRare(value, digits);
-    return 0;
+    if (!HasMantissa(value)) return detail::UnpackRare(value, digits);
+    const std::uint64_t rare = bytes[1] < 128 ? Decode<true>(bytes, digits) : Decode<false>(bytes, digits);
+    return rare ? detail::UnpackRare(value, digits) : 0;
 }
 
 void SetInfinity(bool negative, OCINumber* result) noexcept;
 
 // Writes normalized digits, of which the last four are 0. kOverflow or kUnderflow when the exponent does not fit.
 inline Errno Pack(const Digits& digits, OCINumber* result) noexcept {
-    using namespace detail;
-    std::uint8_t* bytes = result->OCINumberPart;
     if (digits.IsZero()) {
         SetZero(result);
         return 0;
     }
     if (digits.exponent > kMaxExponent) return kOverflow;
     if (digits.exponent < kMinExponent) return kUnderflow;
-    const int count = CountDigits(digits);
-    const std::uint64_t(&mask)[4] = kMasks.rows[count];
-    const std::uint64_t* w = digits.words;
-    if (!digits.negative) {
-        bytes[0] = static_cast<std::uint8_t>(count + 1);
-        bytes[1] = static_cast<std::uint8_t>(193 + digits.exponent);
-        Store(bytes + 2, w[0] + (Repeat(1) & mask[0]));
-        Store(bytes + 10, w[1] + (Repeat(1) & mask[1]));
-        Store(bytes + 18, static_cast<std::uint32_t>((w[2] + (Repeat(1) & mask[2])) >> 32));
-        return 0;
-    }
-    const std::uint64_t(&end)[4] = kTerminators.rows[count];
-    bytes[0] = static_cast<std::uint8_t>(std::min(count + 2, kMantissaDigits + 1));
-    bytes[1] = static_cast<std::uint8_t>(62 - digits.exponent);
-    Store(bytes + 2, ((Repeat(101) & mask[0]) - w[0]) | end[0]);
-    Store(bytes + 10, ((Repeat(101) & mask[1]) - w[1]) | end[1]);
-    Store(bytes + 18, static_cast<std::uint32_t>((((Repeat(101) & mask[2]) - w[2]) | end[2]) >> 32));
+    if (digits.negative) Encode<true>(digits, static_cast<unsigned>(62 - digits.exponent), result);
+    else Encode<false>(digits, static_cast<unsigned>(193 + digits.exponent), result);
     return 0;
 }
 

@@ -8,8 +8,6 @@
 
 namespace number {
 
-__extension__ using Wide = unsigned __int128;
-
 constexpr std::uint64_t kLimb = 10'000'000'000'000'000u;
 constexpr int kDigitsPerLimb = 8;  // of base 100
 
@@ -35,11 +33,15 @@ inline std::uint64_t WordOfLimb(std::uint64_t limb) {
            (lower - lower_hundreds * 100);
 }
 
+// value / kLimb or one less, for value < 2^108.
+inline std::uint64_t EstimateQuotient(Wide value) {
+    constexpr auto kReciprocal = static_cast<std::uint64_t>((Wide{1} << 117) / kLimb);
+    return static_cast<std::uint64_t>(Wide{static_cast<std::uint64_t>(value >> 44)} * kReciprocal >> 64) >> 9;
+}
+
 // value / kLimb for value < 2^108, with the rest in *rest.
 inline std::uint64_t DivideByLimb(Wide value, std::uint64_t* rest) {
-    constexpr auto kReciprocal = static_cast<std::uint64_t>((Wide{1} << 117) / kLimb);
-    const auto top = static_cast<std::uint64_t>(value >> 44);
-    auto quotient = static_cast<std::uint64_t>(Wide{top} * kReciprocal >> 64) >> 9;  // at most one too small
+    std::uint64_t quotient = EstimateQuotient(value);
     std::uint64_t remainder = static_cast<std::uint64_t>(value) - quotient * kLimb;
     if (remainder >= kLimb) {
         remainder -= kLimb;

@@ -7,19 +7,47 @@ namespace number {
 
 namespace {
 
-// The first 24 digits of a product whose value is 0.words x 100^(exponent + 1).
+// The columns of a product, from the highest.
+struct Product {
+    Wide columns[5];
+
+    Product(const std::uint64_t (&a)[3], const std::uint64_t (&b)[3]) {
+        const std::uint64_t a0 = LimbOfWord(a[0]), a1 = LimbOfWord(a[1]), a2 = LimbOfWord(a[2]);
+        const std::uint64_t b0 = LimbOfWord(b[0]), b1 = LimbOfWord(b[1]), b2 = LimbOfWord(b[2]);
+        columns[0] = Wide{a0} * b0;
+        columns[1] = Wide{a0} * b1 + Wide{a1} * b0;
+        columns[2] = Wide{a0} * b2 + Wide{a1} * b1 + Wide{a2} * b0;
+        columns[3] = Wide{a1} * b2 + Wide{a2} * b1;
+        columns[4] = Wide{a2} * b2;
+    }
+
+    // The first 24 digits, given what the lower columns carry into the second.
+    void Digits24(std::uint64_t carry, std::uint64_t (&words)[3]) const {
+        std::uint64_t high, low;
+        const Wide column = columns[0] + DivideByLimb(columns[1] + carry, &low);
+        words[0] = WordOfLimb(DivideByLimb(column, &high));
+        words[1] = WordOfLimb(high);
+        words[2] = WordOfLimb(low);
+    }
+
+    [[nodiscard]] std::uint64_t ExactCarry() const {
+        std::uint64_t rest;
+        const Wide column = columns[3] + DivideByLimb(columns[4], &rest);
+        return DivideByLimb(columns[2] + DivideByLimb(column, &rest), &rest);
+    }
+
+    // At most two too small.
+    [[nodiscard]] std::uint64_t EstimatedCarry() const {
+        return EstimateQuotient(columns[2] + EstimateQuotient(columns[3]));
+    }
+};
+
+// The first digits of a product whose value is 0.words x 100^(exponent + 1): 22 right ones, which rounding needs, of 24.
 void MultiplyMantissas(const std::uint64_t (&a)[3], const std::uint64_t (&b)[3], std::uint64_t (&words)[3]) {
-    const std::uint64_t a0 = LimbOfWord(a[0]), a1 = LimbOfWord(a[1]), a2 = LimbOfWord(a[2]);
-    const std::uint64_t b0 = LimbOfWord(b[0]), b1 = LimbOfWord(b[1]), b2 = LimbOfWord(b[2]);
-    std::uint64_t rest;
-    Wide column = Wide{a2} * b2;
-    column = Wide{a1} * b2 + Wide{a2} * b1 + DivideByLimb(column, &rest);
-    column = Wide{a0} * b2 + Wide{a1} * b1 + Wide{a2} * b0 + DivideByLimb(column, &rest);
-    column = Wide{a0} * b1 + Wide{a1} * b0 + DivideByLimb(column, &rest);
-    column = Wide{a0} * b0 + DivideByLimb(column, &rest);
-    words[2] = WordOfLimb(rest);
-    words[0] = WordOfLimb(DivideByLimb(column, &rest));
-    words[1] = WordOfLimb(rest);
+    const Product product(a, b);
+    product.Digits24(product.EstimatedCarry(), words);
+    const bool may_carry = (words[2] & 0xFF00) == 99 << 8 && (words[2] & 0xFF) >= 98;
+    if (may_carry) product.Digits24(product.ExactCarry(), words);
 }
 
 // Schoolbook division: the divisor is scaled until its first limb is large, so that each estimate of a quotient limb from
@@ -38,7 +66,7 @@ public:
         (*limbs)[0] = carry;
     }
 
-    // Divides four limbs, leaves the rest shifted up by a limb, and answers the quotient's limb.
+    // The quotient's next limb: divides four limbs and leaves the rest, shifted up by a limb.
     std::uint64_t NextLimb(std::uint64_t (*rest)[4]) const {
         std::uint64_t(&r)[4] = *rest;
         const Wide top = Wide{r[0]} * kLimb + r[1];

@@ -36,7 +36,7 @@ Errno UnpackRare(const OCINumber& value, Digits* digits) noexcept {
 namespace {
 
 // Whether the digits end at or before the units.
-bool IsWhole(const Digits& digits) { return CountDigits(digits) <= digits.exponent + 1; }
+bool IsWhole(const Digits& digits) { return static_cast<int>(CountDigits(digits)) <= digits.exponent + 1; }
 
 bool IsNegativeInfinity(const OCINumber& value) { return value.OCINumberPart[1] == 0; }
 

@@ -56,12 +56,12 @@ void KeepDecimals(Digits* digits, int kept, Toward toward) {
     const bool splits = kept % 2 == 1;
     const int last = DigitAt(*digits, index);
     const int dropped = splits ? last % 10 : last / 10;
-    const int count = CountDigits(*digits);
+    const int count = static_cast<int>(CountDigits(*digits));
     if (room == 0 && (count <= index || (splits && dropped == 0 && count == index + 1))) return;
     const bool up = toward == Toward::nearest ? dropped >= 5
                                               : toward != Toward::zero && (toward == Toward::below) == digits->negative;
     if (splits) SetDigit(digits, index, last - dropped);
-    for (int word = 0; word < 3; ++word) digits->words[word] &= detail::kMasks.rows[index + splits][word];
+    for (int word = 0; word < 3; ++word) digits->words[word] &= detail::kDecoding.rows[0][index + splits].mask.words[word];
     if (up) IncrementDecimal(digits, kept - 1);
     Normalize(digits);
 }
