@@ -27,7 +27,11 @@ public:
           tokens_(Tokenize(text, step.begin, step.end)),
           names_columns_(statement.type == StatementType::create || statement.type == StatementType::alter),
           defines_code_(DefinesCode(tokens_)) {
+        if (!dialect.casts.empty()) FindCasts();
         result_.source_begin = copied_ = step.begin;
+        if (step.run != Run::assign) return;
+        result_.sql = "select ";    // an expression by itself
+        result_.edits.push_back({step.begin, step.begin, 0, result_.sql.size()});
     }
 
     EngineText Result() {
@@ -40,6 +44,7 @@ private:
     // A parenthesis that is open.
     struct Open {
         bool is_cast;        // cast(... as TYPE)
+        std::size_t as;      // of a cast that becomes a function: where the AS stands
         bool is_columns;     // the columns of a table's definition
         bool is_type_size;   // the size behind a type's name
     };
@@ -75,7 +80,8 @@ private:
         const Token& token = tokens_[index];
         if (token.Is("(")) {
             const bool columns = names_columns_ && open_.empty();
-            open_.push_back({Previous(index).Is("cast"), columns, type_end_ == index});
+            const std::size_t as = index > 0 && !cast_as_.empty() ? cast_as_[index - 1] : 0;
+            open_.push_back({Previous(index).Is("cast"), as, columns, type_end_ == index});
         } else if (token.Is(")")) {
             if (!open_.empty()) open_.pop_back();
         } else if (token.Is("*") && !open_.empty() && open_.back().is_type_size) {
@@ -85,6 +91,7 @@ private:
 
     std::size_t VisitWord(std::size_t index) {
         const Token& token = tokens_[index];
+        if (!open_.empty() && open_.back().as == index && index > 0) return VisitCastType(index);
         if (IsTypePlace(index)) return VisitType(index);
         if (!open_.empty() && open_.back().is_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
         if (token.Is("dual") && Previous(index).Is("from") && !dialect_.has_dual) {
@@ -92,12 +99,48 @@ private:
         } else if (token.Is("for") && step_.locks_rows && !dialect_.has_for_update && open_.empty() &&
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);
+        } else if (!cast_as_.empty() && cast_as_[index] > 0) {
+            Replace(token, token.End(), FindCast(cast_as_[index] + 1)->engine);
         } else if (IsDateLiteral(index)) {
             return VisitDateLiteral(index);
         } else if (const auto* spelling = FindFunction(index)) {
             Replace(token, token.End(), spelling->engine);
         }
         return index + 1;
+    }
+
+    // Notes each CAST whose type has a function to do it: the place of its AS, by the place of the word CAST.
+    void FindCasts() {
+        cast_as_.assign(tokens_.size(), 0);
+        std::vector<std::size_t> open;    // the word before each open parenthesis
+        for (std::size_t index = 1; index < tokens_.size(); ++index) {
+            if (tokens_[index].Is("(")) open.push_back(index - 1);
+            if (open.empty()) continue;
+            if (tokens_[index].Is(")")) open.pop_back();
+            else if (tokens_[index].Is("as") && tokens_[open.back()].Is("cast") && FindCast(index + 1)) cast_as_[open.back()] = index;
+        }
+    }
+
+    const engine::Dialect::Spelling* FindCast(std::size_t type) const {
+        const auto found = std::find_if(dialect_.casts.begin(), dialect_.casts.end(),
+                                        [&](const auto& spelling) { return MatchWords(type, spelling.written) > 0; });
+        return found == dialect_.casts.end() ? nullptr : &*found;
+    }
+
+    // "as T(a, b)" of a cast that became a function: its further arguments. Answers the closing parenthesis.
+    std::size_t VisitCastType(std::size_t as) {
+        std::string arguments;
+        int depth = 0;
+        std::size_t index = as + 1;
+        for (; tokens_[index].kind != TokenKind::end; ++index) {
+            const Token& token = tokens_[index];
+            if (token.Is(")") && --depth < 0) break;
+            if (depth > 0 && token.kind == TokenKind::number) arguments.append(", ").append(token.text);
+            if (depth > 0 && token.Is("*")) arguments.append(", 38");
+            if (token.Is("(")) ++depth;
+        }
+        Replace(tokens_[as], tokens_[index].begin, arguments);
+        return index;
     }
 
     // Whether the word stands where a type is named: cast(x as HERE, or behind a column's name in a definition.
@@ -119,18 +162,27 @@ private:
             const std::size_t matched = MatchWords(index, spelling.written);
             if (matched == 0) continue;
             end = index + matched;
-            Replace(tokens_[index], tokens_[end - 1].End(), spelling.engine);
+            std::string replacement(spelling.engine);
+            if (matched > 1 && IsSize(index + 1)) replacement.append("(").append(tokens_[index + 2].text).append(")");
+            Replace(tokens_[index], tokens_[end - 1].End(), replacement);
             break;
         }
         type_end_ = end;    // where the size in parentheses may follow
         return end;
     }
 
-    // How many tokens the words of `written` are at `index`; 0 when they are not there.
+    // Whether a size in parentheses stands at `index`: "(3)".
+    bool IsSize(std::size_t index) const {
+        return At(tokens_, index).Is("(") && At(tokens_, index + 1).kind == TokenKind::number && At(tokens_, index + 2).Is(")");
+    }
+
+    // How many tokens the words of `written` are at `index`; 0 when they are not there. A size may stand behind the first
+    // of several words: timestamp(3) with time zone.
     std::size_t MatchWords(std::size_t index, std::string_view written) const {
         std::size_t count = 0;
         while (!written.empty()) {
             const std::size_t length = std::min(written.find(' '), written.size());
+            if (count == 1 && IsSize(index + 1)) count += 3;
             if (!At(tokens_, index + count).Is(written.substr(0, length))) return 0;
             written.remove_prefix(std::min(length + 1, written.size()));
             ++count;
@@ -205,6 +257,7 @@ private:
     const bool names_columns_;
     const bool defines_code_;
     std::vector<Open> open_;
+    std::vector<std::size_t> cast_as_;    // by token; 0: no cast that becomes a function
     std::size_t type_end_ = std::string_view::npos;
     std::size_t copied_ = 0;
     EngineText result_;

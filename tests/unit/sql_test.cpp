@@ -13,11 +13,13 @@ using sql::StatementType;
 constexpr engine::Dialect::Spelling kTypes[] = {
     {"varchar2", "varchar"}, {"number", "numeric"}, {"raw", "blob"}, {"long raw", "blob"}, {"decfloat", "numeric"}};
 constexpr engine::Dialect::Spelling kFunctions[] = {{"sysdate", "(now())"}};
+constexpr engine::Dialect::Spelling kCasts[] = {{"timestamp", "to_ts"}, {"char", "to_char"}};
 
 engine::Dialect TestDialect() {
     engine::Dialect dialect;
     dialect.types = kTypes;
     dialect.functions = kFunctions;
+    dialect.casts = kCasts;
     return dialect;
 }
 
@@ -106,7 +108,7 @@ TEST(SqlText, Blocks) {
         {"begin open :c for select * from t where a = :a; end;", "select * from t where a = ?1"},
         {"BEGIN OPEN :c FOR select ';' from t; OPEN :d FOR values(:v); END", "select ';' from t | values(?1)"},
         {"begin insert into t values(:a, :a); commit; end name;", "insert into t values(?1, ?2) | commit"},
-        {"begin :x := :y * 2; null; end;", "?1 * 2 | "},
+        {"begin :x := :y * 2; null; end;", "select ?1 * 2 | "},
         {"begin select a, b into :x, :y from t where c = :z; end;", "select a, b  from t where c = ?1"},
     };
     for (const auto& c : cases) {
@@ -165,6 +167,8 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"select cast(cast(:1 as decfloat(34)) as varchar2(9)), number, count(*) from t",
          "select cast(cast(?1 as numeric(34)) as varchar(9)), number, count(*) from t"},
         {"(select * from t)", "(select * from t)"},
+        {"select cast( cast(a as char(9)) as timestamp(6) with time zone), cast(b as timestamp) as char from t",
+         "select to_ts( to_char(a , 9) , 6), to_ts(b ) as char from t"},
         {"select q'{it's}', nq'!x!' from t", "select 'it''s', 'x' from t"},
         {"select a from t for update nowait", "select a from t "},
         {"insert into t values(date '2024-2-9', timestamp '2024-02-09 10:11:12.5', date 'x')",
