@@ -73,8 +73,11 @@ constexpr TypeRow kTypes[] = {
     {"long", SQLT_LNG, Measure::none, 0, 0, 0},
     {"datetime", SQLT_DAT, Measure::none, kDateSize, 0, 0},
     {"date", SQLT_DAT, Measure::none, kDateSize, 0, 0},
+    {"timestamp_tz", SQLT_TIMESTAMP_TZ, Measure::fraction, kZonedTimestampSize, 0, 6},
+    {"timestamp_ltz", SQLT_TIMESTAMP_LTZ, Measure::fraction, kTimestampSize, 0, 6},
+    {"timestamp with time zone", SQLT_TIMESTAMP_TZ, Measure::fraction, kZonedTimestampSize, 0, 6},
+    {"timestamp with local time zone", SQLT_TIMESTAMP_LTZ, Measure::fraction, kTimestampSize, 0, 6},
     {"timestamp", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
-    {"time with time zone", SQLT_TIMESTAMP_TZ, Measure::fraction, kZonedTimestampSize, 0, 6},
     {"time", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
     {"clob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0},
     {"nclob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0},
@@ -152,12 +155,6 @@ bool ReadDeclaredType(std::string_view declared, Column& column) {
     column.precision = row->precision;
     column.scale = row->scale;
     Apply(row->measure, normal, column);
-    if (row->type == SQLT_TIMESTAMP && normal.find("with local time zone") != std::string::npos) {
-        column.type = SQLT_TIMESTAMP_LTZ;
-    } else if (row->type == SQLT_TIMESTAMP && normal.find("with time zone") != std::string::npos) {
-        column.type = SQLT_TIMESTAMP_TZ;
-        column.size = kZonedTimestampSize;
-    }
     return true;
 }
 

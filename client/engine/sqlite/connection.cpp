@@ -26,6 +26,8 @@ constexpr Dialect::Spelling kTypes[] = {
     {"decfloat", "kelp_decfloat"},    // without "floa", which would make every value a real
     {"long raw", "long raw"},
     {"long", "long varchar"},
+    {"timestamp with local time zone", "timestamp_ltz"},
+    {"timestamp with time zone", "timestamp_tz"},
 };
 constexpr Dialect::Spelling kFunctions[] = {
     {"sysdate", "kelp_sysdate()"},
