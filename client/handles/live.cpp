@@ -108,6 +108,16 @@ void Insert(const void* pointer, Kind kind) {
     ++writer.living;
 }
 
+void Retype(const void* pointer, Kind kind) noexcept {
+    const Key key = reinterpret_cast<Key>(pointer);
+    Writer& writer = TheWriter();
+    const std::lock_guard lock(writer.mutex);
+    Table& table = *writer.tables.back();
+    std::size_t index = table.Home(key);
+    while (table.slots[index].key.load(std::memory_order_relaxed) != key) index = table.Next(index);
+    table.slots[index].kind.store(kind, std::memory_order_release);
+}
+
 void Erase(const void* pointer) noexcept {
     const Key key = reinterpret_cast<Key>(pointer);
     Writer& writer = TheWriter();

@@ -62,6 +62,10 @@ public:
     // Whether OCIHandleFree must refuse (24386).
     [[nodiscard]] virtual bool InUse() const { return false; }
 
+protected:
+    // For objects that become something else in place; live::Retype goes with it.
+    void SetType(TypeCode type) { type_ = type; }
+
 private:
     friend class ObjectTree;
     Environment* environment_;
@@ -95,6 +99,7 @@ namespace live {
 Kind KindOf(const void* pointer) noexcept;    // Kind::none when it is no living object
 void Insert(const void* pointer, Kind kind);
 void Erase(const void* pointer) noexcept;
+void Retype(const void* pointer, Kind kind) noexcept;    // of a living object
 }  // namespace live
 
 // The living T behind a pointer, or null. T::kKind says its kind; Live<Object> takes any.
