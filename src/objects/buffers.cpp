@@ -40,7 +40,7 @@ bool ObtainBlocks(MemBuffer& buffer) {
 // Number buffers start as zeros of their type; the first that cannot be made ends it.
 bool SetZero(const MemBuffer& buffer, unsigned char* element) {
     if (buffer.type == SQLT_PDN)
-        return TextToDecimal(kZeroText, element, buffer.precision, buffer.scale) == 0;
+        return TextToDecimal(kZeroText, element, buffer.precision, buffer.scale) == kDecimalDone;
     OCINumber zero;
     if (NumberFromText(kZeroText, zero) != OCI_SUCCESS) return false;
     std::copy_n(zero.OCINumberPart, sizeof zero, element);

@@ -4,7 +4,8 @@
 #include <cstddef>
 #include <memory>
 
-// A zero-filled block of at least one byte. Failure prints "GetMem: failed to allocate memory.\n" and gives null.
+// A zero-filled block of at least one byte and at most 1 GB. Failure prints "GetMem: failed to allocate memory.\n" and
+// gives null.
 void* GetMem(size_t size, int line = __builtin_LINE());
 void FreeMem(void* block);
 

@@ -10,16 +10,10 @@
 
 namespace {
 
-constexpr uint32_t kUtf16 = 1202;
-constexpr uint32_t kUtf8 = 1208;
 constexpr uint32_t kUcs2 = 13488;
 
-// The service's warnings that count as success.
-constexpr int kTruncated = static_cast<int>(0x870F00C0);
-constexpr int kSubstituted = static_cast<int>(0x870F00BC);
-
 uint32_t EffectiveCodePage() {
-    const bool unicode = application_code_page == kUtf8 || application_code_page == kUcs2;
+    const bool unicode = application_code_page == kCodePageUtf8 || application_code_page == kUcs2;
     return unicode ? second_code_page : application_code_page;
 }
 
@@ -39,7 +33,7 @@ int FromUtf16(const void* text, size_t length, std::string& output) {
     if (text == nullptr || length == 0) return 0;
     output.resize(2 * length + 1);
     size_t unused = 0;
-    const int rc = CodePageConvert(kUtf16, EffectiveCodePage(), text, length, nullptr, output.data(), output.size(),
+    const int rc = CodePageConvert(kCodePageUtf16, EffectiveCodePage(), text, length, nullptr, output.data(), output.size(),
                                    &unused);
     output.resize(IsTolerated(rc) ? output.size() - std::min(unused, output.size()) : 0);
     return rc;
@@ -68,7 +62,7 @@ std::string_view Bytes(const void* text, size_t length) {
 }  // namespace
 
 bool IsTolerated(int result) {
-    return result == 0 || result == kTruncated || result == kSubstituted;
+    return result == kCodePageDone || result == kCodePageTruncated || result == kCodePageSubstituted;
 }
 
 int convertToUTF16(const char* input, uint32_t input_length, char* output, uint32_t capacity, uint32_t* output_length,
@@ -94,7 +88,7 @@ int convertToUTF16(const char* input, uint32_t input_length, char* output, uint3
         return 0;
     }
     size_t unused = 0;
-    const int rc = CodePageConvert(EffectiveCodePage(), kUtf16, input, input_length, nullptr, output, capacity, &unused);
+    const int rc = CodePageConvert(EffectiveCodePage(), kCodePageUtf16, input, input_length, nullptr, output, capacity, &unused);
     if (!IsTolerated(rc)) {
         Message(kError, "CodePageConvert failed with rc - %ld\n", static_cast<long>(rc));
         return rc;

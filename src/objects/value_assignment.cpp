@@ -180,10 +180,8 @@ Stored AssignLibraryNumber(const ElementTarget& target, const Value& value) {
 }
 
 Stored AssignPackedDecimal(const ElementTarget& target, const Value& value) {
-    if (target.precision / 2u + 1 > target.size) return std::nullopt;
-    std::string packed(target.precision / 2u + 1, '\0');
-    if (!PackDecimal(value.word, packed, target.precision, target.scale)) return std::nullopt;
-    Copy(target, 0, packed, target.size);
+    if (PackedDecimalSize(target.precision) > target.size) return std::nullopt;
+    if (TextToDecimal(value.word, target.data, target.precision, target.scale) != kDecimalDone) return std::nullopt;
     return target.size;
 }
 

@@ -1,7 +1,9 @@
 #include "objects/value_display.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <cstring>
+#include <string>
 #include <string_view>
 
 #include "core/state.h"
@@ -111,14 +113,19 @@ void ShowReal(Line& line, const ElementView& element) {
 }
 
 void ShowPackedDecimal(Line& line, const ElementView& element) {
-    char text[128] = "";
-    // The precision a script gave may speak of more bytes than there are once the type has been changed.
-    const bool whole = element.precision / 2u + 1 <= element.size;
-    const int rc = whole ? DecimalToText(element.data, element.precision, element.scale, text, sizeof text) : -1;
-    if (rc == 0) return static_cast<void>(line.Format("%s\n", text).Print());
-    line.Print();
-    Message(kError, "DecimalToText failed with rc - %ld\n", static_cast<long>(rc));
-    Message(kOutput, "%s\n", text);
+    constexpr size_t kSignPointAndEnd = 4;
+    std::string text(kSignPointAndEnd + std::max<size_t>(element.precision, static_cast<size_t>(std::abs(element.scale))),
+                     '\0');
+    // The type may have been changed, and the precision speak of more bytes than there are.
+    const bool whole = PackedDecimalSize(element.precision) <= element.size;
+    const int rc = !whole ? kDecimalBadSign
+                          : DecimalToText(element.data, element.precision, element.scale, text.data(), text.size());
+    if (rc != kDecimalDone) {
+        line.Print();
+        Message(kError, "DecimalToText failed with rc - %ld\n", static_cast<long>(rc));
+    }
+    line.Text(text.c_str());
+    EndLine(line);
 }
 
 void ShowDecimalFloat(Line& line, const ElementView& element) {

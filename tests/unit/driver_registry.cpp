@@ -1,0 +1,172 @@
+// The tables of named objects: capacities and messages written down by hand, names, arrays, reserved words.
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "objects/buffers.h"
+#include "objects/registry.h"
+
+namespace {
+
+std::string Printed(auto&& action) {
+    testing::internal::CaptureStdout();
+    action();
+    return testing::internal::GetCapturedStdout();
+}
+
+int object_a, object_b;  // stand for what the library returned
+
+TEST(Registry, CapacitiesAndMessages) {
+    const struct {
+        Kind kind;
+        int capacity;
+        const char* overflow;
+        const char* in_use;
+    } cases[] = {
+        {Kind::environment, 30, "Reached max environment handle count - 30\n", "*** Environment handle already in use\n"},
+        {Kind::error, 30, "Reached max error handle count - 30\n", "*** Error handle already in use\n"},
+        {Kind::svc, 800, "Reached max svc handle count - 800\n", "*** Svc handle already in use\n"},
+        {Kind::server, 800, "Reached max server handle count - 800\n", "*** Server handle already in use\n"},
+        {Kind::session, 800, "Reached max session handle count - 800\n", "*** Session handle already in use\n"},
+        {Kind::trans, 800, "Reached max trans handle count - 800\n", "*** Trans handle already in use\n"},
+        {Kind::spool, 800, "Reached max spool handle count - 800\n", "*** SPool handle already in use\n"},
+        {Kind::cpool, 800, "Reached max cpool handle count - 800\n", "*** SPool handle already in use\n"},
+        {Kind::stmt, 650, "Reached max stmt handle count - 650\n", "*** Stmt handle already in use\n"},
+        {Kind::describe, 650, "Reached max describe handle count - 650\n", "*** Describe handle already in use\n"},
+        {Kind::bind, 256, "Reached max bind handle count - 256\n", "*** Bind handle already in use\n"},
+        {Kind::define, 256, "Reached max define handle count - 256\n", "*** Define handle already in use\n"},
+        {Kind::param, 100, "Reached max param handle count - 100\n", ""},
+        {Kind::lob, 650, "Reached max lob handle count - 650\n", "*** Lob handle already in use\n"},
+        {Kind::result, 650, "Reached max lob handle count - 650\n", "*** Result handle already in use\n"},
+        {Kind::rowid, 650, "Reached max rowid handle count - 650\n", "*** Rowid handle already in use\n"},
+        {Kind::file, 650, "Reached max file handle count - 650\n", "*** File handle already in use\n"},
+        {Kind::datetime, 650, "Reached max datetime handle count - 650\n", "*** Datetime handle already in use\n"},
+        {Kind::string, 650, "Reached max string handle count - 650\n", ""},
+        {Kind::raw, 650, "Reached max raw handle count - 650\n", ""},
+        {Kind::mutex, 650, "Reached max mutex handle count - 650\n", "*** Mutex handle already in use\n"},
+        {Kind::key, 650, "Reached max key handle count - 650\n", "*** Key handle already in use\n"},
+        {Kind::tid, 650, "Reached max tid handle count - 650\n", "*** tid handle already in use\n"},
+        {Kind::thnd, 650, "Reached max thnd handle count - 650\n", "*** thnd handle already in use\n"},
+    };
+    for (const auto& c : cases) {
+        const auto name = [](int number) { return "n" + std::to_string(number); };
+        for (int number = 0; number < c.capacity; ++number)
+            ASSERT_NE(Register(c.kind, name(number).c_str(), &object_a, nullptr), nullptr) << c.overflow << number;
+        EXPECT_EQ(Printed([&] { EXPECT_EQ(Register(c.kind, "one more", &object_a, nullptr), nullptr); }), c.overflow);
+        EXPECT_EQ(Printed([&] { EXPECT_TRUE(CheckInUse(c.kind, "n0")); }), c.in_use);
+        EXPECT_EQ(Printed([&] { EXPECT_FALSE(CheckInUse(c.kind, "one more")); }), "");
+        for (int number = 0; number < c.capacity; ++number) Release(c.kind, name(number).c_str());
+        EXPECT_EQ(FindByName(c.kind, "n0"), nullptr) << c.overflow;
+    }
+    static MemBuffer slots[2];
+    EXPECT_EQ(Printed([] { while (OccupySlot(Kind::buffer, std::span<MemBuffer>(slots), "b") != nullptr) {} }),
+              "Reached max buffer handle count - 256\n");
+}
+
+TEST(Registry, TheLowestFreeSlotIsFilledFirst) {
+    NamedObject* first = Register(Kind::svc, "first", &object_a, nullptr);
+    NamedObject* second = Register(Kind::svc, "second", &object_a, nullptr);
+    Release(Kind::svc, "first");
+    EXPECT_EQ(first->object, &object_a) << "release clears the flag only";
+    EXPECT_EQ(Register(Kind::svc, "third", &object_b, &object_a), first);
+    EXPECT_EQ(FindByPointer(Kind::svc, &object_a), second);
+    EXPECT_EQ(first->parent, &object_a);
+    Release(Kind::svc, "second");
+    Release(Kind::svc, "third");
+    EXPECT_EQ(Printed([] { Release(Kind::svc, "third"); }), "Handle third not found\n");
+}
+
+TEST(Registry, NamesAreCutToTheSlot) {
+    const std::string long_name(40, 'n');
+    const struct {
+        Kind kind;
+        size_t kept;
+    } cases[] = {{Kind::stmt, 31}, {Kind::lob, 31}, {Kind::spool, 35}};
+    for (const auto& c : cases) {
+        NamedObject* slot = Register(c.kind, long_name.c_str(), &object_a, nullptr);
+        EXPECT_EQ(slot->name, long_name.substr(0, c.kept));
+        EXPECT_EQ(ResolveObject(c.kind, long_name.c_str()), &object_a);
+        EXPECT_EQ(ResolveObject(c.kind, (long_name.substr(0, c.kept) + "another end").c_str()), &object_a);
+        EXPECT_EQ(Printed([&] { ResolveObject(c.kind, long_name.substr(0, c.kept - 1).c_str()); }),
+                  "Handle " + long_name.substr(0, c.kept - 1) + " not found\n");
+        Release(c.kind, long_name.c_str());
+    }
+}
+
+TEST(Registry, WordsThatStandForAPointer) {
+    Register(Kind::error, "e1", &object_a, nullptr);
+    Register(Kind::stmt, "s1", &object_b, nullptr);
+    Register(Kind::stmt, "e1", &object_b, nullptr);  // names are unique within a kind only
+    const struct {
+        const char* word;
+        void* pointer;
+        const char* printed;
+    } cases[] = {
+        {"e1", &object_a, ""},
+        {"s1", &object_b, ""},  // any kind may supply an error handle
+        {"E1", nullptr, "Handle E1 not found\n"},
+        {"NULL", nullptr, ""},
+        {"nulls", nullptr, "Handle nulls not found\n"},
+        {"-1", nullptr, "Handle -1 not found\n"},
+        {"Invalid", InvalidObject(), ""},
+    };
+    for (const auto& c : cases)
+        EXPECT_EQ(Printed([&] { EXPECT_EQ(ResolveErrorObject(c.word), c.pointer) << c.word; }), c.printed);
+    EXPECT_EQ(ResolveObject(Kind::stmt, "e1"), &object_b);
+    EXPECT_EQ(Printed([] { EXPECT_EQ(ResolveObject(Kind::stmt, "e2"), nullptr); }), "Handle e2 not found\n");
+    EXPECT_STREQ(static_cast<char*>(InvalidObject()), "Invalid buffer");
+    Release(Kind::error, "e1");
+    Release(Kind::stmt, "e1");
+    Release(Kind::stmt, "s1");
+}
+
+TEST(Registry, ReservedWordsAreNoNames) {
+    for (const char* name : {"null", "INVALID"})
+        EXPECT_EQ(Printed([&] { EXPECT_EQ(Register(Kind::lob, name, &object_a, nullptr), nullptr); }),
+                  "Variable name NULL not allowed\n");
+    EXPECT_EQ(OutputName("-1"), nullptr);
+    EXPECT_EQ(OutputName("Null"), nullptr);
+    EXPECT_STREQ(OutputName("invalid"), "invalid");
+}
+
+TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
+    void* array[] = {&object_a, &object_b};
+    Register(Kind::lob, "arr", array, nullptr)->array_count = 2;
+    Register(Kind::lob, "one", &object_b, nullptr);
+    const struct {
+        const char* word;
+        void* object;
+        bool is_array;
+        long index;
+    } cases[] = {
+        {"arr[0]", &object_a, false, 0},   {"arr[1]", &object_b, false, 1}, {"arr[2]", array, true, 2},
+        {"arr", array, true, 0},           {"arr[-1]", array, true, -1},    {"arr[1x", &object_b, false, 1},
+        {"arr[]", &object_a, false, 0},    {"one[5]", &object_b, false, 5}, {"one", &object_b, false, 0},
+        {"invalid", InvalidObject(), false, 0},
+    };
+    for (const auto& c : cases) {
+        const DescriptorReference found = ResolveDescriptor(Kind::lob, c.word);
+        EXPECT_EQ(found.object, c.object) << c.word;
+        EXPECT_EQ(found.is_array, c.is_array) << c.word;
+        EXPECT_EQ(found.index, c.index) << c.word;
+    }
+    EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "arr2[1]"); }), "Handle arr2 not found\n");
+    EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "null[1]"); }), "");
+    EXPECT_EQ(Printed([] { ResolveObject(Kind::stmt, "s[1]"); }), "Handle s[1] not found\n");
+    Release(Kind::lob, "arr");
+    Release(Kind::lob, "one");
+}
+
+TEST(Registry, KindsOfNumericTypes) {
+    for (int type = -130; type < 100; ++type) {
+        const bool handle = (type >= 1 && type <= 10) || type == 26 || type == 27;
+        const bool descriptor = type == 50 || type == 52 || type == 54 || type == 56 || type == 62;
+        EXPECT_EQ(KindOfHandleType(type).has_value(), handle) << type;
+        EXPECT_EQ(KindOfDescriptorType(type).has_value(), descriptor) << type;
+    }
+    EXPECT_EQ(KindOfHandleType(26), Kind::cpool);
+    EXPECT_EQ(KindOfHandleType(8), Kind::server);
+    EXPECT_EQ(KindOfDescriptorType(62), Kind::datetime);
+}
+
+}  // namespace

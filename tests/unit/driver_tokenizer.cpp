@@ -1,0 +1,109 @@
+// The words that a line gives, and what quotes do beyond the line's own end.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "core/tokenizer.h"
+
+namespace {
+
+using Words = std::vector<std::string>;
+
+struct Tokenized {
+    Words words;
+    std::string printed;
+};
+
+// Tokenizes the line in a buffer that holds `left_over` from an earlier line.
+Tokenized Split(const std::string& line, const std::string& left_over = "") {
+    static char buffer[kLineSize];
+    std::memset(buffer, 0, sizeof buffer);
+    std::memcpy(buffer, left_over.c_str(), left_over.size() + 1);
+    std::memcpy(buffer, line.c_str(), line.size() + 1);
+    TokenVector tokens;
+    testing::internal::CaptureStdout();
+    const int count = Tokenize(buffer, buffer, tokens);
+    Tokenized result{{}, testing::internal::GetCapturedStdout()};
+    for (int index = 0; index < count; ++index) result.words.push_back(tokens.Words()[index]);
+    return result;
+}
+
+const std::string kMissingQuote = "Parser warning: Missing end delimiter \"\"\"\n";
+
+TEST(Tokenizer, SplitsALine) {
+    const struct {
+        const char* line;
+        Words words;
+    } cases[] = {
+        {"OCIStmtPrepare stmt err \"select 1 from dual\"\n", {"OCIStmtPrepare", "stmt", "err", "select 1 from dual"}},
+        {"opt PRINTSQLFUNCTIONCODE#note\n", {"opt", "PRINTSQLFUNCTIONCODE"}},
+        {"a \"b c\"d e\n", {"a", "b c", "e"}},
+        {"a \"b # c\" d\n", {"a", "b # c", "d"}},
+        {"a \"b\"#c d\n", {"a", "b"}},
+        {"a \"b\"c#d e\n", {"a", "b"}},
+        {"\"\"\n", {""}},
+        {" \t a \t b \t\n", {"a", "b"}},
+        {"a b # c\n", {"a", "b"}},
+        {"a b\r\n", {"a", "b"}},
+        {"a\vb\n", {"a", "b"}},
+        {"a \v b\n", {"a", "", "b"}},
+        {"ab\"c d\"e\n", {"ab\"c", "d\"e"}},
+        {"no line end", {"no", "line", "end"}},
+        {"\xff\x80\x01 \xc3\xa4\n", {"\xff\x80\x01", "\xc3\xa4"}},
+        {"a \"\" b\n", {"a", "", "b"}},
+    };
+    for (const auto& c : cases) {
+        const Tokenized result = Split(c.line);
+        EXPECT_EQ(result.words, c.words) << c.line;
+        EXPECT_EQ(result.printed, "") << c.line;
+    }
+}
+
+TEST(Tokenizer, AnOpenQuoteTakesTheRestOfTheLine) {
+    const Tokenized result = Split("a \"b c\n");
+    EXPECT_EQ(result.words, (Words{"a", "b c\n"}));
+    EXPECT_EQ(result.printed, kMissingQuote);
+}
+
+TEST(Tokenizer, AnOpenQuoteIsClosedByWhatAnEarlierLineLeft) {
+    const Tokenized result = Split("a \"b\n", "# 45678 \" c \"d\" e\n");
+    EXPECT_EQ(result.words, (Words{"a", "b\n", "c", "d", "e"}));
+    EXPECT_EQ(result.printed, "");
+}
+
+TEST(Tokenizer, WordsBeyondTheSlotsAreDroppedWithOneWarning) {
+    std::string line;
+    for (int index = 0; index < kTokenSlots + 2; ++index) line += "w ";
+    const Tokenized result = Split(line + "\n");
+    EXPECT_EQ(result.words.size(), size_t{kTokenSlots});
+    EXPECT_EQ(result.printed, "Parser warning: Too many tokens\n");
+}
+
+TEST(Tokenizer, ALineThatFillsTheBuffer) {
+    const std::string word(kLineSize - 1, 'x');
+    EXPECT_EQ(Split(word).words, Words{word});
+    std::string quoted = word;
+    quoted[0] = '"';
+    EXPECT_EQ(Split(quoted).words, Words{word.substr(1)});
+    quoted.back() = '"';
+    EXPECT_EQ(Split(quoted).words, Words{word.substr(2)});
+}
+
+TEST(Tokenizer, ASlotKeepsItsBufferForLaterLines) {
+    TokenVector tokens;
+    tokens.StrAllocAndCopy(3, "first");
+    const char* room = tokens.Words()[3];
+    tokens.StrAllocAndCopy(3, "2nd");
+    EXPECT_EQ(tokens.Words()[3], room);
+    EXPECT_STREQ(room, "2nd");
+    EXPECT_STREQ(room + 4, "t") << "the old contents stay behind the closing zero";
+
+    testing::internal::CaptureStdout();
+    tokens.StrAllocAndCopy(3, std::string(kLineSize, 'x').c_str());
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), "StrAllocAndCopy(): inString len > MAX_BUFFER_SIZE !\n");
+    EXPECT_STREQ(room, "2nd");
+}
+
+}  // namespace

@@ -1,0 +1,226 @@
+// Elements as they are stored from a script's texts and as they are shown, for the types that need no library.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <sstream>
+#include <string>
+
+#include "core/keywords.h"
+#include "core/state.h"
+#include "objects/buffers.h"
+#include "objects/decimal_float.h"
+#include "objects/value_assignment.h"
+#include "objects/value_display.h"
+#include "oci.h"
+
+namespace {
+
+// One element with a guard behind it.
+struct Element {
+    int type;
+    uint32_t size;
+    unsigned char data[64];
+    int16_t indicator = 7;
+    uint16_t length = 7;
+    uint16_t return_code = 0;
+    uint16_t precision = 0;
+    int16_t scale = 0;
+
+    Element(int type, uint32_t size) : type(type), size(size) { std::memset(data, 0xEE, sizeof data); }
+
+    // What is printed; the guard must not have been touched.
+    std::string Assign(const char* word, long given) {
+        testing::internal::CaptureStdout();
+        AssignText({type, data, size, &indicator, &length, &return_code, precision, scale}, word, given);
+        for (size_t index = size; index < sizeof data; ++index) EXPECT_EQ(data[index], 0xEE) << word << " at " << index;
+        return testing::internal::GetCapturedStdout();
+    }
+    std::string Show() const {
+        testing::internal::CaptureStdout();
+        Line line;
+        DisplayElement(line, {type, data, size, indicator, return_code, length, precision, scale, false});
+        return testing::internal::GetCapturedStdout();
+    }
+    std::string Bytes(size_t count) const { return {reinterpret_cast<const char*>(data), count}; }
+};
+
+TEST(Values, TextsStoredAndShown) {
+    const struct {
+        int type;
+        uint32_t size;
+        const char* word;
+        long given;
+        int length;
+        const char* shown;
+    } cases[] = {
+        {SQLT_CHR, 5, "abcde", 3, 3, "\"abc\"\n"},
+        {SQLT_CHR, 5, "abcdefgh", 8, 5, "\"abcde\"\n"},
+        {SQLT_CHR, 5, "abc", -1, 0, "\"\"\n"},
+        {SQLT_LNG, 5, "abc", 3, 3, "\"abc\"\n"},
+        {SQLT_STR, 5, "abcdefgh", 8, 4, "\"abcd\"\n"},
+        {SQLT_STR, 5, "ab", 100000, 4, "\"ab\"\n"},
+        {SQLT_STR, 0, "ab", 2, 0, "\"\"\n"},
+        {SQLT_AFC, 5, "ab", 2, 5, "\"ab   \"\n"},
+        {SQLT_VCS, 6, "abcdef", 3, 5, "\"abc\"\n"},
+        {SQLT_AVC, 6, "abcdef", 6, 6, "\"abcd\"\n"},
+        {SQLT_LVC, 8, "abcdef", 6, 8, "\"abcd\"\n"},
+        {SQLT_BIN, 5, "abc", 2, 2, "\"6162\"\n"},
+        {SQLT_BIN, 5, "X'01abFF'", 9, 3, "\"01ABFF\"\n"},
+        {SQLT_LBI, 5, "X'01abFF'", 2, 2, "\"01AB\"\n"},
+        {SQLT_VBI, 6, "X'01abFF'", 9, 5, "\"01ABFF\"\n"},
+        {SQLT_RID, 10, "X'01'", 5, 5, "\"5827303127\"\n"},
+        {SQLT_INT, 1, "-128", 4, 1, "-128\n"},
+        {SQLT_INT, 2, "32767", 1, 2, "32767\n"},
+        {SQLT_INT, 4, "-2147483648", 4, 4, "-2147483648\n"},
+        {SQLT_INT, 8, "+9223372036854775807", 8, 8, "9223372036854775807\n"},
+        {SQLT_UIN, 8, "18446744073709551615", 8, 8, "18446744073709551615\n"},
+        {SQLT_UIN, 3, "65535", 3, 3, "65535\n"},
+        {SQLT_FLT, 4, "1.5", 4, 4, "1.500000\n"},
+        {SQLT_FLT, 8, "-1e3", 8, 8, "-1000.000000\n"},
+        {SQLT_FLT, 16, "0.25", 16, 16, "0.250000\n"},
+        {SQLT_DAT, 7, "2024-02-29-13:05:00", 7, 7, "\"2024-02-29-13:05:00\"\n"},
+        {SQLT_DAT, 7, "2023-02-29-13:05:00", 7, 7, "Invalid date found\n"},
+        {SQLT_DAT, 7, "2024-12-31", 7, 7, "\"2024-12-31-00:00:00\"\n"},
+        {SQLT_ODT, 8, "1999-01-02-03:04:60", 8, 8, "1999-01-02-03:04:60\n"},
+        {SQLT_ODT, 8, "1999-01-02-03:04:61", 8, 8, "1999-01-02-03:04:61\nInvalid OCITimeSS - 61\n"},
+    };
+    for (const auto& c : cases) {
+        Element element(c.type, c.size);
+        EXPECT_EQ(element.Assign(c.word, c.given), "") << c.type << " " << c.word;
+        EXPECT_EQ(element.length, c.length) << c.type << " " << c.word;
+        EXPECT_EQ(element.indicator, 0);
+        EXPECT_EQ(element.Show(), c.shown) << c.type << " " << c.word;
+    }
+}
+
+TEST(Values, AWordThatIsNoValueChangesNothing) {
+    const struct {
+        int type;
+        uint32_t size;
+        const char* word;
+    } cases[] = {
+        {SQLT_INT, 1, "128"},      {SQLT_INT, 4, "12x"},         {SQLT_INT, 4, ""},
+        {SQLT_UIN, 4, "-1"},       {SQLT_FLT, 8, "one"},         {SQLT_FLT, 2, "1"},
+        {SQLT_BIN, 5, "X'0'"},     {SQLT_VBI, 8, "X'0G'"},       {SQLT_DAT, 7, "yesterday"},
+        {SQLT_ODT, 8, "-1-1-1"},   {SQLT_CLOB, 8, "no_such_lob"}, {SQLT_RSET, 8, "no_such_result"},
+        {SQLT_BFLOAT, 8, "1.2.3"}, {SQLT_BFLOAT, 8, "1E400"},    {SQLT_TIME, 8, "12:00:00"},
+    };
+    for (const auto& c : cases) {
+        Element element(c.type, c.size);
+        const std::string before = element.Bytes(sizeof element.data);
+        EXPECT_EQ(element.Assign(c.word, 30), std::string("Invalid value - ") + c.word + "\n") << c.type;
+        EXPECT_EQ(element.Bytes(sizeof element.data), before) << c.type << " " << c.word;
+        EXPECT_EQ(element.indicator, 7);
+        EXPECT_EQ(element.length, 7);
+    }
+}
+
+TEST(Values, NullSetsTheIndicatorOnly) {
+    Element element(SQLT_INT, 4);
+    EXPECT_EQ(element.Assign("Null", 4), "");
+    EXPECT_EQ(element.indicator, -1);
+    EXPECT_EQ(element.length, 0);
+    EXPECT_EQ(element.Bytes(4), "\xEE\xEE\xEE\xEE");
+    EXPECT_EQ(element.Show(), "\n");
+}
+
+TEST(Values, WhatFollowsTheFrame) {
+    Element element(SQLT_INT, 4);
+    element.Assign("5", 1);
+    const struct {
+        int indicator, return_code;
+        const char* shown;
+    } cases[] = {{0, 0, "5\n"}, {0, 1, "5\n"}, {-2, 0, "5\n"}, {3, 0, "5\n"}, {-1, 0, "\n"}, {0, 1406, "\n"}};
+    for (const auto& c : cases) {
+        element.indicator = static_cast<int16_t>(c.indicator);
+        element.return_code = static_cast<uint16_t>(c.return_code);
+        EXPECT_EQ(element.Show(), c.shown) << c.indicator << " " << c.return_code;
+    }
+    element.indicator = 0;
+    element.return_code = 0;
+    for (const int type : {0, 185, 186, 233, 65408}) {
+        element.type = type;
+        EXPECT_EQ(element.Show(), "") << type;
+    }
+}
+
+// Lengths that the library returned, or prefixes in the data, may say more than there is.
+TEST(Values, LengthsAreNotFollowedPastTheElement) {
+    const struct {
+        int type;
+        uint32_t size;
+        const char* shown;
+    } cases[] = {
+        {SQLT_CHR, 2, "\"\xFF\xFF\"\n"},     {SQLT_STR, 2, "\"\xFF\xFF\"\n"}, {SQLT_BIN, 2, "\"FFFF\"\n"},
+        {SQLT_VCS, 4, "\"\xFF\xFF\"\n"},     {SQLT_VCS, 1, "\"\"\n"},         {SQLT_VBI, 3, "\"FF\"\n"},
+        {SQLT_LVC, 6, "\"\"\n"},             {SQLT_FLT, 2, "0.000000\n"},     {SQLT_DAT, 7, "Invalid date found\n"},
+        {SQLT_DAT, 3, "Invalid date found\n"}, {SQLT_CUR, 8, "Non null value\n"}, {SQLT_RSET, 0, "Null value\n"},
+        {SQLT_RDD, 8, "RID\n"},
+    };
+    for (const auto& c : cases) {
+        Element element(c.type, c.size);
+        std::memset(element.data, 0xFF, c.size);
+        element.indicator = 0;
+        element.length = 65535;
+        EXPECT_EQ(element.Show(), c.shown) << c.type << " of " << c.size;
+    }
+}
+
+TEST(Values, ElementSizesByType) {
+    const struct {
+        const char* types;
+        uint32_t given, size;
+    } cases[] = {
+        {"sqlt_num sqlt_vnu", 100, 22},
+        {"sqlt_int", 8, 8},
+        {"sqlt_int", 3, 4},
+        {"sqlt_flt", 4, 4},
+        {"sqlt_flt", 16, 16},
+        {"sqlt_flt", 2, 8},
+        {"sqlt_vcs sqlt_vbi sqlt_avc", 10, 12},
+        {"sqlt_lvc", 10, 14},
+        {"sqlt_rid", 99, 10},
+        {"sqlt_dat", 99, 7},
+        {"sqlt_bfloat", 99, 8},
+        {"sqlt_bdouble", 99, 16},
+        {"sqlt_lvb sqlt_cur sqlt_rdd sqlt_clob sqlt_blob sqlt_rset sqlt_vst sqlt_odt sqlt_date", 99, 8},
+        {"sqlt_timestamp sqlt_timestamp_tz sqlt_timestamp_ltz", 99, 8},
+        {"sqlt_chr sqlt_str sqlt_lng sqlt_bin sqlt_lbi sqlt_uin sqlt_afc sqlt_time sqlt_time_tz", 3, 3},
+    };
+    for (const auto& c : cases) {
+        std::istringstream types(c.types);
+        for (std::string type; types >> type;)
+            EXPECT_EQ(ElementSize(DecodeKeyword(type.c_str(), SqltKeywords), c.given, 0), c.size) << type;
+    }
+    EXPECT_EQ(ElementSize(SQLT_PDN, 10, 10), 6u);
+    EXPECT_EQ(ElementSize(SQLT_PDN, 31, 31), 16u);
+}
+
+TEST(Values, DecimalFloats) {
+    const struct {
+        const char* text;
+        uint32_t size;
+        const char* hex;  // least significant byte first
+    } cases[] = {
+        {"0", 8, "000000000000C031"},
+        {"1", 8, "010000000000C031"},
+        {"-1", 8, "010000000000C0B1"},
+        {"12.5", 8, "7D0000000000A031"},
+        {"9999999999999999", 8, "FFFFC06FF286736C"},
+        {"99999999999999995", 8, "0080C6A47E8D0332"},
+        {"1E384", 8, "0080C6A47E8DE35F"},
+        {"1E-398", 8, "0100000000000000"},
+        {"4E-399", 8, "0000000000000000"},
+        {"5E-399", 8, "0100000000000000"},
+        {"1", 16, "01000000000000000000000000004030"},
+        {"-0.1", 16, "01000000000000000000000000003EB0"},
+    };
+    for (const auto& c : cases) {
+        unsigned char bytes[16];
+        ASSERT_TRUE(DecimalFloatFromText(c.text, c.size, bytes)) << c.text;
+        Line hex;
+        EXPECT_EQ(hex.Hex(bytes, c.size).View(), c.hex) << c.text << " in " << c.size;
+    }
+}
+
+}  // namespace
