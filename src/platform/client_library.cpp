@@ -3,8 +3,8 @@
 // HARNIX_CLIENT_LIBRARY names it, by path or by soname. Unset, it is the bundled one, beside the executable's directory
 // or in it. HARNIX_TRACE_LOAD names a file that then lists every candidate tried and what the dynamic loader said.
 //
-// Other libraries can be driven although they lack what only ours has: a function whose name ends in NS falls back to the
-// name without it, OCI_memGetMemCount and XaGetInfo may be absent, and HARNIX_XA_SWITCH names another XA switch.
+// Other libraries can be driven although they lack what only ours has: a function whose name ends in NS falls back to
+// the name without it, OCI_memGetMemCount and XaGetInfo may be absent, and HARNIX_XA_SWITCH names another XA switch.
 #include "platform/client_library.h"
 
 #include <dlfcn.h>
@@ -39,7 +39,10 @@ constexpr int kOwnSymbols = RTLD_LOCAL;
 #endif
 
 // How a candidate is tried: with everything resolved at once, then leaving to the calls what cannot be resolved.
-constexpr struct { int flags; const char* name; } kModes[] = {{RTLD_NOW | kOwnSymbols, "now"}, {RTLD_LAZY | RTLD_LOCAL, "lazy"}};
+constexpr struct {
+    int flags;
+    const char* name;
+} kModes[] = {{RTLD_NOW | kOwnSymbols, "now"}, {RTLD_LAZY | RTLD_LOCAL, "lazy"}};
 
 struct {
     bool tried = false;

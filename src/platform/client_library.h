@@ -1,6 +1,6 @@
-// The client library as the driver sees it: a table of its functions, and Call, the one door through which every call of
-// the driver goes. The library is loaded at the first call; client_library.cpp tells which one. Nothing is printed here:
-// what is missing is told to the function given to SetLoaderComplaint.
+// The client library as the driver sees it: a table of its functions, and Call, the one door through which every call
+// of the driver goes. The library is loaded at the first call; client_library.cpp tells which one. Nothing is printed
+// here: what is missing is told to the function given to SetLoaderComplaint.
 //
 //   const sword rc = Call(&ClientLibrary::OCIStmtFetch2, stmt, err, rows, orientation, offset, mode);
 //   const int result = Call(&xa_switch_t::xa_start_entry, &xid, rmid, flags);

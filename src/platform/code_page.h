@@ -19,10 +19,10 @@ enum CodePageResult : int {
     kCodePageFailed = 3                                     // the converter could not be opened
 };
 
-// Converts `input_length` bytes and never writes more than `capacity`; nothing is terminated. An area that is too short
-// holds whole characters only. What cannot be converted becomes U+FFFD where the target has it, else a question mark; so
-// does a character that the input breaks off. The bytes not read and not written go to the last arguments, which may be
-// null; on failure they are all.
+// Converts `input_length` bytes and never writes more than `capacity`; nothing is terminated. An area that is too
+// short holds whole characters only. What cannot be converted becomes U+FFFD where the target has it, else a question
+// mark; so does a character that the input breaks off. The bytes not read and not written go to the last arguments,
+// which may be null; on failure they are all.
 int CodePageConvert(std::uint32_t source, std::uint32_t target, const void* input, std::size_t input_length,
                     std::size_t* unused_input, void* output, std::size_t capacity, std::size_t* unused_output);
 

@@ -49,7 +49,8 @@ bool IsTrimmed(std::string_view text) {
 
 // Whether what is written could be read back.
 bool CanHold(std::string_view section, std::string_view key, std::string_view value) {
-    const bool key_is_clean = !key.empty() && IsTrimmed(key) && key.find('=') == key.npos && key.find_first_of("[;#") != 0;
+    const bool key_is_clean =
+        !key.empty() && IsTrimmed(key) && key.find('=') == key.npos && key.find_first_of("[;#") != 0;
     const bool section_is_clean = IsTrimmed(section) && section.find(']') == section.npos;
     return key_is_clean && section_is_clean && IsOneLine(section) && IsOneLine(key) && IsOneLine(value);
 }

@@ -65,7 +65,8 @@ std::vector<std::string> IniText::Keys(std::string_view section) const {
     std::vector<std::string> keys;
     for (const Line& line : lines_) {
         if (line.key.empty() || !Same(line.section, section)) continue;
-        if (std::ranges::none_of(keys, [&](const std::string& key) { return Same(key, line.key); })) keys.push_back(line.key);
+        const auto same = [&](const std::string& key) { return Same(key, line.key); };
+        if (std::ranges::none_of(keys, same)) keys.push_back(line.key);
     }
     return keys;
 }

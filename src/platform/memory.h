@@ -4,8 +4,8 @@
 
 #include <cstddef>
 
-// A block filled with zeros, aligned for any type; null when memory does not suffice. A size of 0 gives a block too. The
-// tag is kept by pointer: a literal.
+// A block filled with zeros, aligned for any type; null when memory does not suffice. A size of 0 gives a block too.
+// The tag is kept by pointer: a literal.
 void* PlatformAlloc(std::size_t size, const char* tag, int line);
 
 // False when the pointer is refused; null is.

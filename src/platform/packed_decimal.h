@@ -1,5 +1,5 @@
-// Packed decimal: two digits a byte, most significant first; the low half of the last byte is the sign, C, A, E or F for
-// plus, D or B for minus. A value of precision p takes p / 2 + 1 bytes and means its digits times 10^-scale.
+// Packed decimal: two digits a byte, most significant first; the low half of the last byte is the sign, C, A, E or F
+// for plus, D or B for minus. A value of precision p takes p / 2 + 1 bytes and means its digits times 10^-scale.
 #pragma once
 
 #include <cstddef>
@@ -18,11 +18,11 @@ enum DecimalResult : int {
     kDecimalOverflow = 5      // more digits before the point than the precision leaves room for
 };
 
-// Writes sign, digits and point, such as "-0.05", with as many places as the scale says and a terminator. On failure the
-// area holds the text so far, terminated (nothing when the capacity is 0).
+// Writes sign, digits and point, such as "-0.05", with as many places as the scale says and a terminator. On failure
+// the area holds the text so far, terminated (nothing when the capacity is 0).
 int DecimalToText(const unsigned char* packed, std::uint32_t precision, std::int32_t scale, char* text,
                   std::size_t capacity);
 
-// Reads an optional sign, digits with an optional point and an optional exponent, blanks around. Places beyond the scale
-// are rounded, half away from zero. On failure `packed` is left as it was.
+// Reads an optional sign, digits with an optional point and an optional exponent, blanks around. Places beyond the
+// scale are rounded, half away from zero. On failure `packed` is left as it was.
 int TextToDecimal(const char* text, unsigned char* packed, std::uint32_t precision, std::int32_t scale);

@@ -3,7 +3,8 @@
 
 #include <cstddef>
 
-// A conversion under way: what is left to read and where to write. Each step leaves both behind the last whole character.
+// A conversion under way: what is left to read and where to write. Each step leaves both behind the last whole
+// character.
 struct Conversion {
     const unsigned char* input;
     const unsigned char* input_end;

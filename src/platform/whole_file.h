@@ -3,12 +3,12 @@
 
 #include <string>
 
-// False when the file is there but cannot be read, or is larger than a file of settings can be. A file that is missing is
-// empty.
+// False when the file is there but cannot be read, or is larger than a file of settings can be. A file that is missing
+// is empty.
 bool ReadWholeFile(const std::string& path, std::string& content);
 
-// Held while a file is read, changed and replaced, so that no other process or thread does the same in its directory, as
-// far as the file system knows locks.
+// Held while a file is read, changed and replaced, so that no other process or thread does the same in its directory,
+// as far as the file system knows locks.
 class DirectoryLock {
 public:
     explicit DirectoryLock(const std::string& path_of_file);
