@@ -72,6 +72,13 @@ constexpr Command kCommandTable[] = {
 
 static_assert(sizeof kCommandTable / sizeof *kCommandTable == kCommandCount + 1);
 
+// The first four characters rule most rows out; every word of the table has as many, a closing zero counted.
+static bool Begins(const char* folded, size_t length, const char* word) {
+    constexpr size_t kHead = 4;
+    if (length >= kHead && std::memcmp(folded, word, kHead) != 0) return false;
+    return std::strncmp(folded, word, length) == 0;
+}
+
 const Command* FindCommand(const char* word) {
     char folded[32];
     const size_t length = std::strlen(word);
@@ -79,7 +86,7 @@ const Command* FindCommand(const char* word) {
     for (size_t index = 0; index < length; ++index)
         folded[index] = static_cast<char>(std::tolower(static_cast<unsigned char>(word[index])));
     for (const Command* row = kCommandTable; row->word != nullptr; ++row)
-        if (folded[0] == row->word[0] && std::strncmp(folded, row->word, length) == 0) return row;
+        if (Begins(folded, length, row->word)) return row;
     return nullptr;
 }
 

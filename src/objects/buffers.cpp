@@ -14,6 +14,7 @@
 namespace {
 
 MemBuffer buffers[256];
+size_t used_slots = 0;  // those behind them have never held a buffer: a lookup need not go there
 
 constexpr char kZeroText[] = "0.0";
 
@@ -53,6 +54,11 @@ void InitialiseNumbers(const MemBuffer& buffer) {
         if (!SetZero(buffer, buffer.Element(index))) return;
 }
 
+void NoteUse(const MemBuffer& buffer) {
+    for (size_t slot = used_slots; slot < std::size(buffers); ++slot)
+        if (&buffers[slot] == &buffer) used_slots = slot + 1;
+}
+
 template <class T> void FreeBlock(T*& block) {
     FreeMem(std::exchange(block, nullptr));
 }
@@ -64,7 +70,7 @@ std::span<MemBuffer> Buffers() {
 }
 
 MemBuffer* FindBufferQuietly(const char* name) {
-    return FindSlot(Buffers(), name);
+    return FindSlot(Buffers().first(used_slots), name);
 }
 
 MemBuffer* FindBuffer(const char* name) {
@@ -102,6 +108,7 @@ uint32_t ElementSize(int type, uint32_t given, uint32_t precision) {
 
 int AllocateBuffer(MemBuffer& buffer, void* statement, uint32_t element_size, uint32_t array_size, int type,
                    uint16_t precision, int16_t scale) {
+    NoteUse(buffer);
     buffer.statement = statement;
     buffer.data = nullptr;
     buffer.call_data = nullptr;
