@@ -1,6 +1,7 @@
 #include "core/script.h"
 
 #include <sys/resource.h>
+#include <sys/stat.h>
 
 #include <algorithm>
 #include <cstdlib>
@@ -86,6 +87,15 @@ size_t StackForLevels() {
     return limit.rlim_cur / 2;
 }
 
+// Opens a script for reading; null for what cannot be read, a folder too, which the system would only refuse later.
+std::FILE* OpenScript(const char* name) {
+    std::FILE* file = std::fopen(name, "r");
+    struct stat status;
+    if (file == nullptr || fstat(fileno(file), &status) != 0 || !S_ISDIR(status.st_mode)) return file;
+    std::fclose(file);
+    return nullptr;
+}
+
 }  // namespace
 
 void ReadAndEvaluateScript(std::FILE* stream) {
@@ -106,7 +116,7 @@ bool RoomForAnotherLevel() {
 void ReadScript(int count, char** words) {
     if (count != 2) return Message(kError, "Invalid Syntax: %s \n", "read FileName");
     if (!RoomForAnotherLevel()) return Message(kError, "Scripts are nested too deeply to read: %s !\n", words[1]);
-    std::FILE* file = std::fopen(words[1], "r");
+    std::FILE* file = OpenScript(words[1]);
     if (file == nullptr) return Message(kError, "Could not open file: %s !\n", words[1]);
     ReadAndEvaluateScript(file);
     std::fclose(file);
