@@ -1,0 +1,146 @@
+// Texts between the application code page and UTF-16: what is converted, what is said, what a command passes on.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+
+#include "core/state.h"
+#include "objects/text_conversion.h"
+
+namespace {
+
+std::string Printed(auto&& action) {
+    testing::internal::CaptureStdout();
+    action();
+    return testing::internal::GetCapturedStdout();
+}
+
+std::string Wide(std::string_view text) {
+    std::string wide;
+    for (const char character : text) wide += {character, '\0'};
+    return wide;
+}
+
+std::string Succeeded(int in, int out) {
+    return "convertToUTF16 succeeded - In length - " + std::to_string(in) + ", Out length - " + std::to_string(out) + "\n";
+}
+
+// A word as commands get it: in a token buffer.
+const char* Token(const std::string& text) {
+    static char buffer[TextArgument::kTokenBufferSize];
+    std::memset(buffer, 0, sizeof buffer);
+    std::memcpy(buffer, text.data(), text.size());
+    return buffer;
+}
+
+class Texts : public testing::Test {
+protected:
+    void SetUp() override {
+        application_code_page = 1208;
+        second_code_page = 819;
+    }
+    void TearDown() override { Utf16Mode = false; }
+};
+
+TEST_F(Texts, ConvertToUtf16) {
+    const struct {
+        std::string input;
+        uint32_t length, capacity;
+        bool quiet;
+        int result;
+        std::string output, printed;
+    } cases[] = {
+        {"abc", 3, 12, false, 0, Wide("abc"), Succeeded(3, 6)},
+        {"abc", 2, 12, true, 0, Wide("ab"), ""},
+        {"\xE4", 1, 4, true, 0, Wide("\xE4"), ""},  // the second code page stands in for UTF-8
+        {"abc", 3, 4, false, static_cast<int>(0x870F00C0), Wide("ab"), Succeeded(3, 4)},
+        {"W'abc'", 6, 24, true, 0, "abc", Succeeded(6, 3)},
+        {"W'abc'", 5, 24, true, 0, Wide("W'abc"), ""},  // the length decides where the word ends
+        {"W'abc'", 6, 2, true, 0, "ab", Succeeded(6, 2)},
+        {"W''", 3, 12, false, 0, "", Succeeded(3, 0)},
+        {"W'", 2, 8, true, 0, Wide("W'"), ""},
+        {"", 0, 4, false, 0, "", ""},
+        {"abc", 3, 0, false, -1, "", "cbOutLen is zero\n"},
+    };
+    for (const auto& c : cases) {
+        std::string area(c.capacity, 'x');
+        uint32_t length = 99;
+        int result = 77;
+        EXPECT_EQ(Printed([&] {
+                      result = convertToUTF16(Token(c.input), c.length, area.data(), c.capacity, &length, c.quiet);
+                  }),
+                  c.printed)
+            << c.input;
+        EXPECT_EQ(result, c.result) << c.input;
+        EXPECT_EQ(area.substr(0, length), c.output) << c.input;
+    }
+    char area[4] = "xxx";
+    uint32_t length = 0;
+    convertToUTF16("", 0, area, sizeof area, &length);
+    EXPECT_EQ(std::string(area, 4), std::string(4, '\0')) << "an empty word clears the area";
+    EXPECT_EQ(Printed([&] { convertToUTF16("a", 1, nullptr, 0, &length); }), "pOut is NULL\n");
+    EXPECT_EQ(Printed([&] { convertToUTF16(nullptr, 1, area, 0, &length); }), "pIn is NULL\n");
+    second_code_page = 77777;
+    EXPECT_EQ(Printed([&] { convertToUTF16("a", 1, area, 4, &length); }), "CodePageConvert failed with rc - 1\n");
+}
+
+TEST_F(Texts, ConvertFromUtf16) {
+    std::string output = "before";
+    EXPECT_TRUE(convertFromUTF16(Wide("ab\xE4").data(), 6, output));
+    EXPECT_EQ(output, "ab\xE4");
+    EXPECT_TRUE(convertFromUTF16(nullptr, 6, output));
+    EXPECT_EQ(output, "");
+    second_code_page = 1208;
+    EXPECT_TRUE(convertFromUTF16(Wide("\xE4\xE4\xE4").data(), 6, output));
+    EXPECT_EQ(output, "\xC3\xA4\xC3\xA4\xC3\xA4") << "nothing is cut in a multi-byte code page";
+    second_code_page = 77777;
+    EXPECT_EQ(Printed([&] { EXPECT_FALSE(convertFromUTF16("a", 2, output)); }), "convertFromUTF16 failed: rc = 1\n");
+    Line line;
+    line.Text("before ");
+    EXPECT_EQ(Printed([&] { EXPECT_FALSE(AddQuotedText(line, "a", 2, true)); }),
+              "before convertFromUTF16 failed: rc = 1\n");
+}
+
+TEST_F(Texts, Utf16TextsEndAtTheFirstZeroPair) {
+    const std::string text = Wide("ab") + std::string(2, '\0') + Wide("c");
+    EXPECT_EQ(Utf16Length(text.data(), text.size()), 4u);
+    EXPECT_EQ(Utf16Length(text.data(), 3), 2u);
+    EXPECT_EQ(Utf16Length("\0\1\0\0", 4), 2u) << "a zero byte alone ends nothing";
+    EXPECT_EQ(Utf16Length(text.data(), 0), 0u);
+}
+
+TEST_F(Texts, ArgumentsAsTheyAreTyped) {
+    TextArgument argument;
+    const char* word = Token("scott");
+    for (const long length : {0L, 3L, 5L, 9999L}) {
+        ASSERT_TRUE(argument.Set(word, length, TextArea::four_times));
+        EXPECT_EQ(reinterpret_cast<const char*>(argument.Text()), word);
+        EXPECT_EQ(argument.Length(), length);
+    }
+    ASSERT_TRUE(argument.Set(word, 20000, TextArea::four_times));
+    EXPECT_EQ(argument.Text()[19999], 0) << "what is passed can be read up to its length";
+    EXPECT_STREQ(reinterpret_cast<const char*>(argument.Text()), "scott");
+    ASSERT_TRUE(argument.Set(word, -1, TextArea::four_times));
+    EXPECT_EQ(argument.Length(), 4294967295u);
+    ASSERT_TRUE(argument.Set("NULL", 4, TextArea::four_times));
+    EXPECT_EQ(argument.Text(), nullptr);
+    EXPECT_EQ(argument.Length(), 4u);
+}
+
+TEST_F(Texts, ArgumentsInUtf16Mode) {
+    Utf16Mode = true;
+    TextArgument argument;
+    EXPECT_EQ(Printed([&] { EXPECT_TRUE(argument.Set(Token("scott"), 5, TextArea::four_times)); }), Succeeded(5, 10));
+    EXPECT_EQ(std::string(reinterpret_cast<const char*>(argument.Text()), argument.Length()), Wide("scott"));
+    EXPECT_EQ(Printed([&] { EXPECT_FALSE(argument.Set(Token("scott"), 0, TextArea::four_times)); }),
+              "cbOutLen is zero\n");
+    EXPECT_EQ(Printed([&] { EXPECT_TRUE(argument.Set(Token("scott"), 0, TextArea::four_times_and_one)); }), "");
+    EXPECT_EQ(argument.Length(), 0u);
+    EXPECT_NE(argument.Text(), nullptr);
+    EXPECT_EQ(Printed([&] { EXPECT_FALSE(argument.Set(Token("scott"), -1, TextArea::four_times)); }),
+              "Could not allocate memory\n");
+    EXPECT_EQ(Printed([&] { EXPECT_TRUE(argument.Set("null", 4, TextArea::four_times)); }), "");
+    EXPECT_EQ(argument.Text(), nullptr);
+}
+
+}  // namespace
