@@ -4,24 +4,40 @@
 
 #include "core/command_table.h"
 
+void AddBindCommands(HandlerTable& handlers);
 void AddBufferCommands(HandlerTable& handlers);
+void AddConvenienceCommands(HandlerTable& handlers);
 void AddDateCommands(HandlerTable& handlers);
 void AddDateTimeCommands(HandlerTable& handlers);
+void AddEnvironmentCommands(HandlerTable& handlers);
 void AddErrorCommands(HandlerTable& handlers);
+void AddFetchAllCommand(HandlerTable& handlers);
 void AddFileCommands(HandlerTable& handlers);
+void AddHandleCommands(HandlerTable& handlers);
 void AddNumberCommands(HandlerTable& handlers);
 void AddRowidCommands(HandlerTable& handlers);
+void AddSessionCommands(HandlerTable& handlers);
+void AddStatementCommands(HandlerTable& handlers);
 void AddStringCommands(HandlerTable& handlers);
 void AddThreadCommands(HandlerTable& handlers);
+void AddUtilityCommands(HandlerTable& handlers);
 
 inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
+    AddBindCommands,
     AddBufferCommands,
+    AddConvenienceCommands,
     AddDateCommands,
     AddDateTimeCommands,
+    AddEnvironmentCommands,
     AddErrorCommands,
+    AddFetchAllCommand,
     AddFileCommands,
+    AddHandleCommands,
     AddNumberCommands,
     AddRowidCommands,
+    AddSessionCommands,
+    AddStatementCommands,
     AddStringCommands,
     AddThreadCommands,
+    AddUtilityCommands,
 };

@@ -43,7 +43,7 @@ void SayNotConverted(int rc) {
     Message(kError, "convertFromUTF16 failed: rc = %ld\n", static_cast<long>(rc));
 }
 
-bool AddConverted(Line& line, const void* text, size_t length) {
+bool AddConverted(Line& line, const void* text, size_t length, const char* before, const char* after) {
     std::string converted;
     const int rc = FromUtf16(text, length, converted);
     if (!IsTolerated(rc)) {
@@ -51,7 +51,7 @@ bool AddConverted(Line& line, const void* text, size_t length) {
         SayNotConverted(rc);
         return false;
     }
-    line.Text("W\"").Text(converted).Character('"');
+    line.Text(before).Text(converted).Text(after);
     return true;
 }
 
@@ -113,13 +113,19 @@ size_t Utf16Length(const void* text, size_t limit) {
 }
 
 bool AddText(Line& line, const void* text, size_t length, bool utf16) {
-    if (utf16) return AddConverted(line, text, length);
+    if (utf16) return AddConverted(line, text, length, "W\"", "\"");
+    line.Text(Bytes(text, length));
+    return true;
+}
+
+bool AddPlainText(Line& line, const void* text, size_t length, bool utf16) {
+    if (utf16) return AddConverted(line, text, length, "", "");
     line.Text(Bytes(text, length));
     return true;
 }
 
 bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16) {
-    if (utf16) return AddConverted(line, text, length);
+    if (utf16) return AddConverted(line, text, length, "W\"", "\"");
     line.Character('"').Text(Bytes(text, length)).Character('"');
     return true;
 }

@@ -26,6 +26,8 @@ size_t Utf16Length(const void* text, size_t limit);
 // Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". After a failed conversion the
 // line is printed as far as it goes, the failure after it, and false returned.
 bool AddText(Line& line, const void* text, size_t length, bool utf16);
+// The same without W"..." around what was converted.
+bool AddPlainText(Line& line, const void* text, size_t length, bool utf16);
 // The same with quotes around a text that is not UTF-16, too.
 bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16);
 

@@ -1,0 +1,112 @@
+// Options, the client's INI file, removing a file, the locale, pausing. No command here calls the library. Most usage texts
+// end in a line feed of their own, so that an empty line follows them.
+#include <clocale>
+#include <cstdio>
+#include <cstring>
+
+#include "commands/families.h"
+#include "core/keywords.h"
+#include "core/messages.h"
+#include "core/state.h"
+#include "objects/memory.h"
+#include "platform/ini.h"
+#include "platform/numbers.h"
+
+namespace {
+
+bool BeginsWith(const char* word, const char* beginning) {
+    return std::strncmp(word, beginning, std::strlen(beginning)) == 0;
+}
+
+// --- Options ----------------------------------------------------------------------------------------------------------
+
+// Options are only ever switched on, and whatever is not understood passes in silence.
+void SetOption(int count, char** words) {
+    if (count == 3 && BeginsWith(words[1], "REPLACEPWD") && password_given) replace_password = true;
+    if (count == 2 && BeginsWith(words[1], "PRINTSQLFUNCTIONCODE")) print_sql_function_code = true;
+}
+
+// --- The INI file -----------------------------------------------------------------------------------------------------
+
+constexpr char kIniFile[] = "kelpcli.ini";
+constexpr char kIniSection[] = "kelpci";
+constexpr size_t kIniRoom = 65000;
+constexpr char kReadIniUsage[] = "ReadIni [keyword]\n";
+
+Memory<char> AllocateIniRoom() {
+    return Memory<char>(static_cast<char*>(GetMem(kIniRoom)));
+}
+
+void PrintSetting(const char* key) {
+    const Memory<char> value = AllocateIniRoom();
+    if (value == nullptr) return;
+    IniReadString(kIniFile, kIniSection, key, "", value.get(), kIniRoom);
+    if (value.get()[0] == '\0') Message(kOutput, "%s not set\n", key);
+    else Message(kOutput, "%s=%s\n", key, value.get());
+}
+
+void PrintAllSettings() {
+    const Memory<char> keys = AllocateIniRoom();
+    if (keys == nullptr) return;
+    IniReadString(kIniFile, kIniSection, nullptr, "", keys.get(), kIniRoom);
+    if (keys.get()[0] == '\0') Message(kOutput, "No sections found\n");
+    for (const char* key = keys.get(); *key != '\0'; key += std::strlen(key) + 1) PrintSetting(key);
+}
+
+// The one complaint about a word count that goes to the output stream.
+void ReadIni(int count, char** words) {
+    if (count > 2) return Message(kOutput, "Invalid Syntax: %s\n", kReadIniUsage);
+    if (count == 2) PrintSetting(words[1]);
+    else PrintAllSettings();
+}
+
+void WriteIni(int count, char** words) {
+    IniWriteString(kIniFile, kIniSection, words[1], count == 3 ? words[2] : nullptr);
+}
+
+// --- Surroundings -----------------------------------------------------------------------------------------------------
+
+// Said of a file that was not there, too.
+void DeleteFile(int, char** words) {
+    static_cast<void>(std::remove(words[1]));
+    Message(kOutput, "File %s removed\n", words[1]);
+}
+
+// The C library's category. What is none of ours is none of its either.
+int CategoryOf(const char* word) {
+    constexpr int kCategories[] = {LC_ALL, LC_COLLATE, LC_CTYPE, LC_MONETARY, LC_NUMERIC, LC_TIME};
+    const int category = DecodeKeyword(word, LocaleCategoryKeywords);
+    return category == kNotFound ? kNotFound : kCategories[category];
+}
+
+void SetLocale(int, char** words) {
+    const int category = CategoryOf(words[1]);
+    const char* locale = IsNull(words[2]) ? nullptr : words[2];
+    if (SameIgnoringCase(words[2], "en_US")) locale = "american";
+    const char* answer = std::setlocale(category, locale);
+    if (answer == nullptr) return Message(kOutput, "setlocale failed\n");
+    Message(kOutput, locale == nullptr ? "Current locale is not null\n" : "setlocale succeeded\n");
+}
+
+void Pause(int count, char** words) {
+    if (count != 2) return Message(kError, "Syntax Error: pause sleep_in_milliseconds\n");
+    SleepMilliseconds(DecodeLong(words[1]));
+}
+
+void DebugMemory(int, char**) {}
+
+constexpr PlainCommand kUtilityCommands[] = {
+    {{50, kAnyWords, ""}, SetOption},
+    {{52, kAnyWords, kReadIniUsage}, ReadIni},
+    {{51, Words(2, 3), "WriteIni keyword [value]\n"}, WriteIni},
+    {{367, Words(2), "DeleteFile filename\n"}, DeleteFile},
+    {{413, Words(3), "setlocale category locale\n"}, SetLocale},
+    {{406, kAnyWords, "pause sleep_in_milliseconds"}, Pause},
+    {{446, Words(1), "memDebug\n"}, DebugMemory},
+};
+
+}  // namespace
+
+void AddUtilityCommands(HandlerTable& handlers) {
+    handlers.Add(kUtilityCommands);
+}
