@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <array>
 #include <cctype>
-#include <string>
 
 #include "engine/sqlite/functions.h"
 
@@ -72,21 +71,23 @@ bool ClosesLast(const std::vector<std::string_view>& pieces, std::size_t open) {
     return false;
 }
 
-std::string_view CastType(const std::vector<std::string_view>& pieces) {
+// cast(e as T(a, b)), or F(e, a, b) of a function that casts.
+std::string CastType(const std::vector<std::string_view>& pieces) {
     if (pieces.size() < 4 || pieces[1] != "(" || !ClosesLast(pieces, 1)) return {};
     const auto* cast = std::find_if(std::begin(kCasts), std::end(kCasts),
                                     [&](const Dialect::Spelling& spelling) { return Is(pieces[0], spelling.engine); });
-    if (cast != std::end(kCasts)) return cast->written;
-    if (!Is(pieces[0], "cast")) return {};
+    const bool by_function = cast != std::end(kCasts);
+    if (!by_function && !Is(pieces[0], "cast")) return {};
     int depth = 0;
     for (std::size_t index = 1; index + 1 < pieces.size(); ++index) {
         if (pieces[index] == "(") ++depth;
         if (pieces[index] == ")") --depth;
-        if (depth != 1 || !Is(pieces[index], "as")) continue;
+        if (depth != 1 || !(by_function ? pieces[index] == "," : Is(pieces[index], "as"))) continue;
         const char* begin = pieces[index + 1].data();
-        return {begin, static_cast<std::size_t>(pieces.back().data() - begin)};
+        const std::string rest(begin, pieces.back().data());
+        return by_function ? std::string(cast->written) + '(' + rest + ')' : rest;
     }
-    return {};
+    return by_function ? std::string(cast->written) : std::string();
 }
 
 SelectItem ReadItem(std::string_view text) {

@@ -1,6 +1,7 @@
 // The select list of a statement's text, as far as SQLite does not tell what an expression is: row ids and casts.
 #pragma once
 
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -8,7 +9,7 @@ namespace engine::sqlite {
 
 struct SelectItem {
     bool is_row_id = false;
-    std::string_view cast_type;    // of an expression that is wholly a cast: its type; a view of the text
+    std::string cast_type;    // of an expression that is wholly a cast: its type
 };
 
 // One item a column; none when the text is no query whose list can be told, as with "*".

@@ -1,0 +1,474 @@
+// The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good arguments,
+// with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <functional>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "kelpci.h"
+#include "oci.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+
+const OraText* Text(const char* text) { return reinterpret_cast<const OraText*>(text); }
+ub4 Length(const char* text) { return text ? static_cast<ub4>(std::strlen(text)) : 0; }
+
+OCIEnv* NewEnvironment(ub4 mode = OCI_DEFAULT) {
+    OCIEnv* env = nullptr;
+    EXPECT_EQ(OCIEnvCreate(&env, mode, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+    return env;
+}
+
+template <class T>
+T* NewHandle(OCIEnv* env, ub4 type) {
+    dvoid* handle = nullptr;
+    EXPECT_EQ(OCIHandleAlloc(env, &handle, type, 0, nullptr), OCI_SUCCESS) << type;
+    return static_cast<T*>(handle);
+}
+
+sb4 FirstCode(dvoid* handle, ub4 type = OCI_HTYPE_ERROR) {
+    sb4 code = 0;
+    return OCIErrorGet(handle, 1, nullptr, &code, nullptr, 0, type) == OCI_SUCCESS ? code : 0;
+}
+
+class CallsTest : public testing::Test {
+protected:
+    void SetUp() override {
+        char name[] = "/tmp/kelp-calls-XXXXXX";
+        folder_ = mkdtemp(name);
+        setenv("KELPCI_HOME", folder_.c_str(), 1);
+        env_ = NewEnvironment();
+        err_ = NewHandle<OCIError>(env_, OCI_HTYPE_ERROR);
+    }
+    void TearDown() override {
+        EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
+        EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
+        fs::remove_all(folder_);
+    }
+
+    // 0, or the number of the error; the return code itself when there is no record.
+    sb4 Answer(sword code) const {
+        if (code == OCI_SUCCESS) return 0;
+        const sb4 number = FirstCode(err_);
+        return number != 0 ? number : code;
+    }
+    sb4 LogOn(OCISvcCtx** svc, const char* user, const char* password, const char* database = "test") {
+        return Answer(OCILogon(env_, err_, svc, Text(user), Length(user), Text(password), Length(password), Text(database),
+                               Length(database)));
+    }
+    template <class T>
+    T Attribute(dvoid* handle, ub4 type, ub4 attribute) {
+        T value{};
+        EXPECT_EQ(Answer(OCIAttrGet(handle, type, &value, nullptr, attribute, err_)), 0) << attribute;
+        return value;
+    }
+
+    std::string folder_;
+    OCIEnv* env_ = nullptr;
+    OCIError* err_ = nullptr;
+};
+
+TEST_F(CallsTest, EveryTypeIsMadeAndFreedOnce) {
+    for (ub4 type = 0; type < 100; ++type) {
+        dvoid* made = &type;
+        const bool handle = type >= 1 && type <= 29;
+        const sword rc = OCIHandleAlloc(env_, &made, type, 0, nullptr);
+        EXPECT_EQ(rc, handle ? OCI_SUCCESS : OCI_ERROR) << type;
+        if (!handle) {
+            EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24316) << type;
+            EXPECT_EQ(made, &type) << "the output is written on success only";
+            continue;
+        }
+        EXPECT_EQ(OCIHandleFree(made, type == 29 ? 1 : type + 1), OCI_INVALID_HANDLE) << "another type " << type;
+        EXPECT_EQ(OCIDescriptorFree(made, type), OCI_INVALID_HANDLE) << type;
+        EXPECT_EQ(OCIHandleFree(made, type), OCI_SUCCESS) << type;
+        EXPECT_EQ(OCIHandleFree(made, type), OCI_INVALID_HANDLE) << "freed twice " << type;
+    }
+    for (ub4 type = 0; type < 100; ++type) {
+        dvoid* made = nullptr;
+        const bool descriptor = type >= 50 && type <= 81;
+        ASSERT_EQ(OCIDescriptorAlloc(env_, &made, type, 0, nullptr), descriptor ? OCI_SUCCESS : OCI_ERROR) << type;
+        if (!descriptor) {
+            EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24332) << type;
+            continue;
+        }
+        EXPECT_EQ(OCIHandleFree(made, type), OCI_INVALID_HANDLE) << type;
+        EXPECT_EQ(OCIDescriptorFree(made, type), OCI_SUCCESS) << type;
+        EXPECT_EQ(OCIDescriptorFree(made, type), OCI_INVALID_HANDLE) << type;
+    }
+}
+
+TEST_F(CallsTest, ArrayDescriptorsShareOneLife) {
+    dvoid* array[5] = {};
+    dvoid* extra = nullptr;
+    ASSERT_EQ(OCIArrayDescriptorAlloc(env_, array, OCI_DTYPE_TIMESTAMP, 5, 64, &extra), OCI_SUCCESS);
+    ASSERT_NE(extra, nullptr);
+    std::memset(extra, 0xAA, 64);
+    EXPECT_EQ(OCIDescriptorFree(array[2], OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
+    EXPECT_EQ(OCIArrayDescriptorFree(array, OCI_DTYPE_LOB), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIArrayDescriptorFree(array, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
+    EXPECT_EQ(OCIDescriptorFree(array[4], OCI_DTYPE_TIMESTAMP), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIArrayDescriptorFree(array, OCI_DTYPE_TIMESTAMP), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIArrayDescriptorFree(nullptr, OCI_DTYPE_LOB), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIArrayDescriptorAlloc(env_, array, OCI_DTYPE_LOB, 0, 0, nullptr), OCI_ERROR);
+    dvoid* single = nullptr;
+    ASSERT_EQ(OCIDescriptorAlloc(env_, &single, OCI_DTYPE_LOB, 0, nullptr), OCI_SUCCESS);
+    EXPECT_EQ(OCIArrayDescriptorFree(&single, OCI_DTYPE_LOB), OCI_INVALID_HANDLE) << "not made as an array";
+}
+
+TEST_F(CallsTest, UserMemoryComesZeroedAndIsFoundAgain) {
+    dvoid* handle = nullptr;
+    dvoid* extra = nullptr;
+    ASSERT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 100, &extra), OCI_SUCCESS);
+    for (int index = 0; index < 100; ++index) ASSERT_EQ(static_cast<char*>(extra)[index], 0);
+    std::memset(extra, 1, 100);
+    EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_USER_MEMORY), extra);
+    EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_ENV), env_);
+    EXPECT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, SIZE_MAX, &extra), OCI_ERROR) << "more than there is";
+    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 1019);
+}
+
+// Whatever is no living handle of the kind: null, text, a handle of another kind, one that is freed.
+TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
+    char text[15] = "Invalid buffer";
+    dvoid* freed = NewHandle<dvoid>(env_, OCI_HTYPE_SVCCTX);
+    OCIHandleFree(freed, OCI_HTYPE_SVCCTX);
+    dvoid* other = NewHandle<dvoid>(env_, OCI_HTYPE_TRANS);
+    OCIServer* server = NewHandle<OCIServer>(env_, OCI_HTYPE_SERVER);
+    ub4 number = 0;
+    dvoid* out = nullptr;
+    for (dvoid* bad : {static_cast<dvoid*>(nullptr), static_cast<dvoid*>(text), freed, other, static_cast<dvoid*>(text + 3)}) {
+        auto* err = static_cast<OCIError*>(bad);
+        auto* svc = static_cast<OCISvcCtx*>(bad);
+        auto* buf = reinterpret_cast<OraText*>(text);
+        OCISvcCtx* svc_out = nullptr;
+        const sword refused[] = {
+            OCIHandleAlloc(bad, &out, OCI_HTYPE_STMT, 0, nullptr), OCIHandleFree(bad, OCI_HTYPE_STMT),
+            OCIDescriptorAlloc(bad, &out, OCI_DTYPE_LOB, 0, nullptr), OCIDescriptorFree(bad, OCI_DTYPE_LOB),
+            OCIArrayDescriptorAlloc(bad, &out, OCI_DTYPE_LOB, 1, 0, nullptr),
+            OCIErrorGet(bad, 1, nullptr, nullptr, buf, 15, OCI_HTYPE_ERROR), OCIErrorGet(bad, 1, nullptr, nullptr, buf, 15, 1),
+            OCIAttrGet(bad, OCI_HTYPE_SVCCTX, &number, nullptr, OCI_ATTR_ENV, err_),
+            OCIAttrSet(bad, OCI_HTYPE_SVCCTX, &number, 0, OCI_ATTR_SERVER, err_),
+            OCIAttrGet(server, OCI_HTYPE_SERVER, &number, nullptr, OCI_ATTR_ENV, err),
+            OCIAttrSet(server, OCI_HTYPE_SERVER, &number, 0, OCI_ATTR_NONBLOCKING_MODE, err),
+            OCILogon(static_cast<OCIEnv*>(bad), err_, &svc_out, nullptr, 0, nullptr, 0, nullptr, 0),
+            OCILogon(env_, err, &svc_out, nullptr, 0, nullptr, 0, nullptr, 0), OCILogoff(svc, err_), OCILogoff(svc, err),
+            OCIServerAttach(static_cast<OCIServer*>(bad), err_, nullptr, 0, 0), OCIServerAttach(server, err, nullptr, 0, 0),
+            OCIServerDetach(static_cast<OCIServer*>(bad), err_, 0),
+            OCISessionBegin(svc, err_, static_cast<OCISession*>(bad), 1, 0),
+            OCISessionEnd(svc, err_, static_cast<OCISession*>(bad), 0), OCIPing(svc, err_, 0), OCIBreak(bad, err_),
+            OCIReset(bad, err_), OCIPasswordChange(svc, err_, buf, 2, buf, 2, buf, 2, 0),
+            OCIServerVersion(bad, err_, buf, 15, OCI_HTYPE_SVCCTX), OCIServerVersion(server, err, buf, 15, OCI_HTYPE_SERVER)};
+        for (std::size_t call = 0; call < std::size(refused); ++call) EXPECT_EQ(refused[call], OCI_INVALID_HANDLE) << call;
+        EXPECT_EQ(FirstCode(err_), 0) << "no record";
+    }
+    EXPECT_EQ(OCIEnvCreate(nullptr, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_ERROR);
+    EXPECT_EQ(OCIHandleAlloc(env_, nullptr, OCI_HTYPE_STMT, 0, nullptr), OCI_ERROR);
+    EXPECT_EQ(OCILogon(env_, err_, nullptr, nullptr, 0, nullptr, 0, nullptr, 0), OCI_ERROR);
+    EXPECT_EQ(OCIServerVersion(server, err_, nullptr, 0, OCI_HTYPE_SERVER), OCI_ERROR);
+}
+
+TEST_F(CallsTest, ErrorTextIsCutAndTerminatedInAnyBuffer) {
+    OCISvcCtx* svc = NewHandle<OCISvcCtx>(env_, OCI_HTYPE_SVCCTX);
+    ASSERT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
+    const std::string whole = "[KELP/CLIENT] ORA-03114: not connected\n";
+    for (ub4 size = 0; size <= whole.size() + 2; ++size) {
+        std::string buffer(whole.size() + 8, 'x');
+        sb4 code = 0;
+        OraText state[6] = "-----";
+        const sword rc = OCIErrorGet(err_, 1, state, &code, reinterpret_cast<OraText*>(buffer.data()), size, OCI_HTYPE_ERROR);
+        EXPECT_EQ(rc, size > whole.size() ? OCI_SUCCESS : OCI_ERROR) << size;
+        EXPECT_EQ(code, 3114);
+        EXPECT_STREQ(reinterpret_cast<char*>(state), "66000");
+        EXPECT_EQ(buffer[size], 'x') << "written past the end";
+        if (size > 0) {
+            EXPECT_EQ(std::string(buffer.c_str()), whole.substr(0, size - 1)) << size;
+        }
+    }
+    EXPECT_EQ(OCIErrorGet(err_, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
+    EXPECT_EQ(OCIErrorGet(err_, 0, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
+    EXPECT_EQ(OCIErrorGet(err_, 1, nullptr, nullptr, nullptr, 0, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
+    EXPECT_EQ(Attribute<sb4>(err_, OCI_HTYPE_ERROR, OCI_ATTR_SQLCODE), 3114) << "asking about the handle keeps its records";
+}
+
+TEST_F(CallsTest, Utf16TextsBothWays) {
+    OCIEnv* env = NewEnvironment(OCI_UTF16);
+    OCIError* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
+    const std::u16string database = u"wide";
+    const std::u16string user = u"\u00c4nne\U0001F600";
+    const auto bytes = [](const std::u16string& text) { return static_cast<ub4>(text.size() * 2); };
+    const auto text = [](const std::u16string& t) { return reinterpret_cast<const OraText*>(t.data()); };
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(OCILogon(env, err, &svc, text(user), bytes(user), text(user), bytes(user), text(database), bytes(database)), 0);
+    EXPECT_TRUE(fs::exists(folder_ + "/wide.db"));
+
+    OCISession* session = nullptr;
+    ASSERT_EQ(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err), OCI_SUCCESS);
+    const char16_t* name = nullptr;
+    ub4 size = 0;
+    ASSERT_EQ(OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &size, OCI_ATTR_USERNAME, err), OCI_SUCCESS);
+    EXPECT_EQ(std::u16string(name, size / 2), user);
+
+    EXPECT_EQ(OCILogon(env, err, &svc, text(user), 3, text(user), 4, text(database), bytes(database)), OCI_ERROR);
+    EXPECT_EQ(FirstCode(err), 24501) << "half a unit";
+    EXPECT_EQ(OCILogon(env, err, &svc, text(user), 10, text(user), 4, text(database), bytes(database)), OCI_ERROR);
+    EXPECT_EQ(FirstCode(err), 24501) << "half a pair";
+    char16_t message[100];
+    char16_t state[6] = u"-----";
+    ASSERT_EQ(OCIErrorGet(err, 1, reinterpret_cast<OraText*>(state), nullptr, reinterpret_cast<OraText*>(message),
+                          sizeof message, OCI_HTYPE_ERROR), OCI_SUCCESS);
+    EXPECT_EQ(std::u16string(state), u"HY000");
+    EXPECT_EQ(std::u16string(message).substr(0, 24), u"[KELP/CLIENT] ORA-24501:");
+    EXPECT_EQ(OCIErrorGet(err, 1, nullptr, nullptr, reinterpret_cast<OraText*>(message), 31, OCI_HTYPE_ERROR), OCI_ERROR);
+    EXPECT_EQ(std::u16string(message), u"[KELP/CLIENT] ") << "whole units";
+    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, "ann", "secret"), 0);
+    OCISvcCtx* const first = svc;
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 2)), 0);
+    EXPECT_EQ(LogOn(&svc, "ann", "secret"), 0) << "again, in place";
+    EXPECT_EQ(svc, first);
+    EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, nullptr, 0, OCI_ATTR_SERVER, err_)), 24325) << "read-only";
+    OCIServer* server = nullptr;
+    ASSERT_EQ(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &server, nullptr, OCI_ATTR_SERVER, err_), OCI_SUCCESS);
+    EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_ERROR);
+    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24386);
+
+    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 3114);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
+    EXPECT_EQ(LogOn(&svc, "ann", "secret"), 0) << "the context is still there";
+    EXPECT_EQ(svc, first);
+    EXPECT_EQ(OCIHandleFree(svc, OCI_HTYPE_SVCCTX), OCI_SUCCESS);
+
+    svc = nullptr;
+    const struct { const char* user; const char* password; const char* database; sb4 number; } refused[] = {
+        {"ann", "wrong", "test", 1017}, {"bob", "secret", "test", 1017}, {"ann", nullptr, "test", 1005},
+        {nullptr, "secret", "test", 1017}, {"ann", "secret", "no/such/folder", 12154},
+        {"ann", "secret", "postgres://host/db", 21520}};
+    for (const auto& c : refused) {
+        EXPECT_EQ(LogOn(&svc, c.user, c.password, c.database), c.number) << c.database;
+        EXPECT_EQ(svc, nullptr) << "nothing is made by a logon that fails";
+    }
+    EXPECT_EQ(LogOn(&svc, "ann", "secret", nullptr), 0) << "the default database";
+    EXPECT_TRUE(fs::exists(folder_ + "/kelp.db"));
+    EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 7)), 24310);
+    EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, Text("x"), 4294967295u, nullptr, 0, nullptr, 0)), 1017) << "a length of nonsense";
+    const struct { ub4 mode; sb4 number; } modes[] = {{OCI_LOGON2_CPOOL, 24392}, {OCI_LOGON2_SPOOL, 24416}, {0x800, 24300}};
+    for (const auto& c : modes) {
+        EXPECT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 0, c.mode)), c.number) << c.mode;
+    }
+    EXPECT_EQ(Answer(OCILogon2(env_, err_, &svc, Text("ann"), 3, Text("secret"), 6, Text("test"), 4, OCI_LOGON2_STMTCACHE)), 0);
+    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
+}
+
+TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {
+    auto* svc = NewHandle<OCISvcCtx>(env_, OCI_HTYPE_SVCCTX);
+    auto* server = NewHandle<OCIServer>(env_, OCI_HTYPE_SERVER);
+    auto* session = NewHandle<OCISession>(env_, OCI_HTYPE_SESSION);
+    const auto set = [&](dvoid* handle, ub4 type, ub4 attribute, dvoid* value, ub4 size = 0) {
+        return Answer(OCIAttrSet(handle, type, value, size, attribute, err_));
+    };
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0)), 24327);
+    EXPECT_EQ(set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER, session), 24328) << "another kind";
+    EXPECT_EQ(set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER, server), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0)), 24327) << "not attached";
+    EXPECT_EQ(Answer(OCIServerDetach(server, err_, 0)), 3114);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), 4, OCI_CPOOL)), 24392);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, nullptr, 4, 0)), 24310);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), -4, 0)), 21560);
+    EXPECT_EQ(Attribute<ub4>(server, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_STATUS), 0u);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), 4, 0)), 0);
+    EXPECT_EQ(Attribute<ub4>(server, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_STATUS), 1u);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), 4, 0)), 24309);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 1012);
+
+    EXPECT_EQ(set(session, OCI_HTYPE_SESSION, OCI_ATTR_USERNAME, const_cast<char*>("ann"), 3), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0)), 1005);
+    EXPECT_EQ(set(session, OCI_HTYPE_SESSION, OCI_ATTR_PASSWORD, const_cast<char*>("secret"), 6), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, 77, 0)), 24323);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, OCI_STMT_CACHE)), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0)), 24313);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 1012) << "begun, but not set in the context";
+    EXPECT_EQ(set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION, session), 0);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
+    EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_ERROR) << "in use";
+    EXPECT_EQ(Answer(OCIBreak(svc, err_)), 0);
+    EXPECT_EQ(Answer(OCIReset(server, err_)), 0);
+
+    auto* second = NewHandle<OCISession>(env_, OCI_HTYPE_SESSION);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, second, OCI_CRED_EXT, 0)), 0) << "a further session on the server";
+    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, second, 0x4000)), 0);
+    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, second, 0)), 1012);
+    EXPECT_EQ(Answer(OCIServerDetach(server, err_, 2)), 0) << "drops the session";
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
+    EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_SUCCESS);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 3114) << "the context's server is gone";
+    EXPECT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &server, nullptr, 4711, err_)), 24315);
+    EXPECT_EQ(Answer(OCIAttrGet(session, OCI_HTYPE_SESSION, &server, nullptr, OCI_ATTR_PASSWORD, err_)), 24315) << "write only";
+    EXPECT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, nullptr, nullptr, OCI_ATTR_ENV, err_)), 21560);
+}
+
+TEST_F(CallsTest, PasswordChange) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, "ann", "one"), 0);
+    const auto change = [&](OCISvcCtx* on, const char* user, const char* from, const char* to, ub4 mode) {
+        return Answer(OCIPasswordChange(on, err_, Text(user), Length(user), Text(from), Length(from), Text(to),
+                                        static_cast<sb4>(Length(to)), mode));
+    };
+    EXPECT_EQ(change(svc, "ann", "two", "three", 0), 28008);
+    EXPECT_EQ(change(svc, "bob", "one", "three", 0), 1017);
+    EXPECT_EQ(change(svc, "ann", "one", nullptr, 0), 988);
+    EXPECT_EQ(change(svc, "ann", "one", "two", 2), 0);
+    EXPECT_EQ(change(svc, nullptr, "two", "three", 0), 0) << "who is logged on";
+    OCISvcCtx* other = nullptr;
+    EXPECT_EQ(LogOn(&other, "ann", "one"), 1017);
+
+    auto* server = NewHandle<OCIServer>(env_, OCI_HTYPE_SERVER);
+    other = NewHandle<OCISvcCtx>(env_, OCI_HTYPE_SVCCTX);
+    EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 3114);
+    ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), 4, 0)), 0);
+    ASSERT_EQ(Answer(OCIAttrSet(other, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
+    EXPECT_EQ(change(other, "ann", "three", "four", 0), 1012);
+    EXPECT_EQ(change(other, "ann", "wrong", "four", OCI_AUTH), 1017);
+    EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 0);
+    EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 0) << "the change has begun a session";
+    EXPECT_EQ(change(other, "ann", "four", "five", 0), 0);
+    EXPECT_EQ(Answer(OCILogoff(other, err_)), 0);
+}
+
+TEST_F(CallsTest, VersionsAreCutToTheBuffer) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, nullptr, nullptr, ":memory:"), 0);
+    OraText text[200];
+    ASSERT_EQ(Answer(OCIServerVersion(svc, err_, text, sizeof text, OCI_HTYPE_SVCCTX)), 0);
+    const std::string whole = reinterpret_cast<char*>(text);
+    EXPECT_NE(whole.find("SQLite 3."), std::string::npos);
+    EXPECT_NE(whole.find('\n'), std::string::npos);
+    ASSERT_EQ(Answer(OCIServerVersion(svc, err_, text, 8, OCI_HTYPE_SVCCTX)), 0);
+    EXPECT_EQ(reinterpret_cast<char*>(text), whole.substr(0, 7));
+    EXPECT_EQ(OCIServerVersion(svc, err_, text, 8, OCI_HTYPE_SERVER), OCI_INVALID_HANDLE);
+    sword major = -1;
+    sword port = -1;
+    OCIClientVersion(&major, nullptr, nullptr, nullptr, &port);
+    EXPECT_GE(major, 1);
+    EXPECT_EQ(port, 0);
+}
+
+// The application's memory functions, which fail at the nth call and count what is out.
+struct FailingMemory {
+    int fail_at = 0;
+    int calls = 0;
+    int out = 0;
+
+    static dvoid* Allocate(dvoid* context, size_t size) {
+        auto& memory = *static_cast<FailingMemory*>(context);
+        if (++memory.calls == memory.fail_at) return nullptr;
+        ++memory.out;
+        auto* block = static_cast<char*>(std::malloc(size + 1));
+        std::memset(block, 0x5A, size + 1);
+        block[0] = 0;
+        return block + 1;    // and aligned to nothing
+    }
+    static dvoid* Reallocate(dvoid*, dvoid*, size_t) { return nullptr; }
+    static void Free(dvoid* context, dvoid* block) {
+        --static_cast<FailingMemory*>(context)->out;
+        std::free(static_cast<char*>(block) - 1);
+    }
+};
+
+// Everything that allocates, until it goes through: each failure is told, and nothing of it stays behind.
+TEST_F(CallsTest, MemoryThatFailsAtEachCallInTurn) {
+    const auto use = [](OCIEnv* env, OCIError*& err) {
+        dvoid* handle = nullptr;
+        dvoid* extra = nullptr;
+        dvoid* array[3];
+        if (OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 8, &extra) != OCI_SUCCESS) return OCI_ERROR;
+        if (OCIHandleAlloc(env, &handle, OCI_HTYPE_SVCCTX, 8, &extra) != OCI_SUCCESS) return OCI_ERROR;
+        if (OCIArrayDescriptorAlloc(env, array, OCI_DTYPE_LOB, 3, 8, &extra) != OCI_SUCCESS) return OCI_ERROR;
+        OCISvcCtx* svc = nullptr;
+        return OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(":memory:"), 8);
+    };
+    sword rc = OCI_ERROR;
+    int failures = 0;
+    for (int fail_at = 1; rc != OCI_SUCCESS; ++fail_at) {
+        ASSERT_LT(fail_at, 100);
+        FailingMemory memory;
+        memory.fail_at = fail_at;
+        OCIEnv* env = nullptr;
+        dvoid* extra = nullptr;
+        rc = OCIEnvCreate(&env, OCI_DEFAULT, &memory, FailingMemory::Allocate, FailingMemory::Reallocate, FailingMemory::Free,
+                          16, &extra);
+        if (rc == OCI_SUCCESS) {
+            OCIError* err = nullptr;
+            rc = use(env, err);
+            if (rc != OCI_SUCCESS) {
+                EXPECT_EQ(rc, OCI_ERROR) << fail_at;
+                EXPECT_EQ(err && FirstCode(err) ? FirstCode(err) : FirstCode(env, OCI_HTYPE_ENV), 1019) << fail_at;
+            }
+            EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+        } else {
+            EXPECT_EQ(env, nullptr);
+        }
+        failures += rc != OCI_SUCCESS;
+        EXPECT_EQ(memory.out, 0) << fail_at;
+    }
+    EXPECT_GE(failures, 10);
+}
+
+TEST_F(CallsTest, InitializeServesEnvInit) {
+    FailingMemory memory;
+    ASSERT_EQ(OCIInitialize(OCI_UTF16, &memory, FailingMemory::Allocate, FailingMemory::Reallocate, FailingMemory::Free), 0);
+    OCIEnv* env = nullptr;
+    ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
+    EXPECT_GT(memory.out, 0);
+    EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 1);
+    EXPECT_EQ(Attribute<ub2>(env, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
+    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    EXPECT_EQ(memory.out, 0);
+    ASSERT_EQ(OCITerminate(OCI_DEFAULT), OCI_SUCCESS);
+    ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
+    EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 0) << "forgotten";
+    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+// Handles come and go in many threads while others are looked up: growth of the set of living objects included.
+TEST_F(CallsTest, HandlesFromManyThreads) {
+    OCIEnv* env = NewEnvironment(OCI_THREADED);
+    std::atomic<int> wrong{0};
+    std::vector<std::thread> threads;
+    for (int number = 0; number < 8; ++number) {
+        threads.emplace_back([&, number] {
+            OCIError* err = nullptr;
+            OCISvcCtx* svc = nullptr;
+            wrong += OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr) != OCI_SUCCESS;
+            const std::string file = folder_ + "/t" + std::to_string(number) + ".db";
+            wrong += OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(file.c_str()), Length(file.c_str())) != OCI_SUCCESS;
+            std::vector<dvoid*> handles(600);
+            for (int round = 0; round < 3; ++round) {
+                for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env, &handle, OCI_HTYPE_TRANS, 0, nullptr) != OCI_SUCCESS;
+                for (dvoid*& handle : handles) wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_SUCCESS;
+                for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env, &handle, 99, 0, nullptr) != OCI_ERROR;
+                wrong += OCIPing(svc, err, 0) != OCI_SUCCESS;
+            }
+            wrong += OCILogoff(svc, err) != OCI_SUCCESS;
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(wrong, 0);
+    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+}  // namespace
