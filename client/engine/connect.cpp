@@ -1,9 +1,11 @@
 // Which database a name stands for, and which engine opens it.
+#include <array>
 #include <cstdlib>
 #include <string>
 
 #include "engine/engine.h"
 #include "engine/sqlite/sqlite.h"
+#include "platform/ini.h"
 
 namespace engine {
 namespace {
@@ -21,6 +23,13 @@ bool IsUrl(std::string_view database) {
     return database.starts_with("postgresql://") || database.starts_with("postgres://");
 }
 
+// What the section of that name in kelpcli.ini says to be its url; empty when there is none.
+std::string UrlOf(std::string_view database) {
+    std::array<char, 4096> url;
+    IniReadString("kelpcli.ini", std::string(database).c_str(), "url", "", url.data(), url.size());
+    return url.data();
+}
+
 std::string FileOf(std::string_view database) {
     if (database == ":memory:" || database.find('/') != std::string_view::npos || database.ends_with(".db")) {
         return std::string(database);
@@ -32,7 +41,7 @@ std::string FileOf(std::string_view database) {
 
 Status Connect(std::string_view database, std::unique_ptr<Connection>& connection) {
     if (database.empty()) database = kDefaultName;
-    if (IsUrl(database)) return Error(kNoDriver, "no PostgreSQL engine in this build");
+    if (IsUrl(database) || !UrlOf(database).empty()) return Error(kNoDriver, "no PostgreSQL engine in this build");
     return sqlite::Connect(FileOf(database), connection);
 }
 

@@ -1,9 +1,7 @@
 // Connections and user sessions: logon, server attach, session begin, password change, versions, ping, break, reset.
-#include <cstring>
-#include <functional>
-#include <optional>
 #include <string>
 
+#include "entry/text_argument.h"
 #include "handles/gate.h"
 #include "oci.h"
 #include "sessions/service_context.h"
@@ -22,16 +20,11 @@ constexpr int kNoPassword = 1005;
 constexpr int kNoNewPassword = 988;
 constexpr int kBadLogon = 1017;
 constexpr int kNotLoggedOn = 1012;
-constexpr int kConnectNameTooLong = 12154;
 
-constexpr std::size_t kLongestText = 1024;    // bytes of a name, a password or a connect text
 constexpr ub4 kPasswordChangeLogsOn = OCI_AUTH;
 
-// An argument of text and length: UTF-8 text on success. What is too long answers `too_long`, unread.
-Status ReadText(const Environment& environment, const OraText* text, ub4 length, int too_long, std::string& utf8) {
-    if (!text || length == 0) return {};
-    if (length > kLongestText) return Error(too_long);
-    const TextIn in(environment, text, length);
+Status ReadText(const Environment& environment, const OraText* text, ub4 length, std::string& utf8) {
+    const TextArgument in(environment, text, length, false);
     if (!in.Valid()) return Error(kBadText);
     utf8 = in.View();
     return {};
@@ -39,9 +32,7 @@ Status ReadText(const Environment& environment, const OraText* text, ub4 length,
 
 Status ReadDatabase(const Environment& environment, const OraText* text, ub4 length, std::string& database) {
     if (!text && length != 0) return Error(kLengthWithoutText);
-    Status status = ReadText(environment, text, length, kConnectNameTooLong, database);
-    database.resize(std::strlen(database.c_str()));    // a length beyond the end of the text
-    return status;
+    return ReadText(environment, text, length, database);
 }
 
 // Without a name and a password it is the operating-system user.
@@ -54,8 +45,8 @@ Status CheckCredentials(engine::Credentials& credentials) {
 
 Status ReadCredentials(const Environment& environment, const OraText* user, ub4 user_length, const OraText* password,
                        ub4 password_length, engine::Credentials& credentials) {
-    Status status = ReadText(environment, user, user_length, kBadLogon, credentials.user);
-    if (status.Ok()) status = ReadText(environment, password, password_length, kBadLogon, credentials.password);
+    Status status = ReadText(environment, user, user_length, credentials.user);
+    if (status.Ok()) status = ReadText(environment, password, password_length, credentials.password);
     return status.Ok() ? CheckCredentials(credentials) : status;
 }
 
@@ -247,9 +238,9 @@ sword OCIPasswordChange(OCISvcCtx* svc, OCIError* err, const OraText* user, ub4 
     return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
         PasswordTexts texts;
         const Environment& environment = service.Env();
-        Status status = ReadText(environment, user, userLen, kBadLogon, texts.user);
-        if (status.Ok()) status = ReadText(environment, oldPw, oldLen, kBadLogon, texts.old_password);
-        if (status.Ok()) status = ReadText(environment, newPw, static_cast<ub4>(newLen), kNoNewPassword, texts.new_password);
+        Status status = ReadText(environment, user, userLen, texts.user);
+        if (status.Ok()) status = ReadText(environment, oldPw, oldLen, texts.old_password);
+        if (status.Ok()) status = ReadText(environment, newPw, static_cast<ub4>(newLen), texts.new_password);
         return status.Ok() ? ChangePassword(service, texts, mode) : status;
     });
 }
@@ -277,7 +268,6 @@ sword OCIBreak(dvoid* svcOrServer, OCIError* err) {
     return EnterLinks(svcOrServer, err, [](Link& link) { link.Cancel(); });
 }
 
-// Nothing is left over from a break: the call that it stopped has told, or none was running.
 sword OCIReset(dvoid* svcOrServer, OCIError* err) {
-    return EnterLinks(svcOrServer, err, [](Link&) {});
+    return EnterLinks(svcOrServer, err, [](Link& link) { link.ForgetCancel(); });
 }

@@ -42,6 +42,11 @@ void Link::Cancel() noexcept {
     if (connection_) connection_->Cancel();
 }
 
+void Link::ForgetCancel() noexcept {
+    const std::lock_guard lock(cancel_mutex_);
+    if (connection_) connection_->ForgetCancel();
+}
+
 std::unique_ptr<engine::Connection> Link::Close() noexcept {
     while (LinkUser* user = AnyUser()) {
         user->LinkClosed();

@@ -51,8 +51,9 @@ public:
     [[nodiscard]] engine::Connection& Engine() { return *connection_; }    // not when closed
     [[nodiscard]] const std::shared_ptr<std::recursive_mutex>& Serial() const { return serial_; }
 
-    // Stops the call that runs on the connection. From any thread.
+    // Stops the call that runs on the connection, or the next one; forgets a stop that met none. From any thread.
     void Cancel() noexcept;
+    void ForgetCancel() noexcept;
 
     // Drops what depends on the connection and gives the connection up; null when closed before.
     std::unique_ptr<engine::Connection> Close() noexcept;

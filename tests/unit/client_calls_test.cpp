@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
 #include <functional>
 #include <string>
 #include <thread>
@@ -254,10 +255,11 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
     EXPECT_EQ(OCIHandleFree(svc, OCI_HTYPE_SVCCTX), OCI_SUCCESS);
 
     svc = nullptr;
+    std::ofstream(folder_ + "/kelpcli.ini") << "[Remote]\nurl = postgresql://host/db\n";
     const struct { const char* user; const char* password; const char* database; sb4 number; } refused[] = {
         {"ann", "wrong", "test", 1017}, {"bob", "secret", "test", 1017}, {"ann", nullptr, "test", 1005},
         {nullptr, "secret", "test", 1017}, {"ann", "secret", "no/such/folder", 12154},
-        {"ann", "secret", "postgres://host/db", 21520}};
+        {"ann", "secret", "postgres://host/db", 21520}, {"ann", "secret", "remote", 21520}};
     for (const auto& c : refused) {
         EXPECT_EQ(LogOn(&svc, c.user, c.password, c.database), c.number) << c.database;
         EXPECT_EQ(svc, nullptr) << "nothing is made by a logon that fails";
@@ -265,7 +267,8 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
     EXPECT_EQ(LogOn(&svc, "ann", "secret", nullptr), 0) << "the default database";
     EXPECT_TRUE(fs::exists(folder_ + "/kelp.db"));
     EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 7)), 24310);
-    EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, Text("x"), 4294967295u, nullptr, 0, nullptr, 0)), 1017) << "a length of nonsense";
+    EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, Text("ann"), 4294967295u, Text("secret"), 100, Text("test"), 9000)), 0)
+        << "lengths beyond the ends of the texts";
     const struct { ub4 mode; sb4 number; } modes[] = {{OCI_LOGON2_CPOOL, 24392}, {OCI_LOGON2_SPOOL, 24416}, {0x800, 24300}};
     for (const auto& c : modes) {
         EXPECT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 0, c.mode)), c.number) << c.mode;
