@@ -1,6 +1,7 @@
 // Allocating and freeing handles, descriptors and arrays of descriptors. Which table an object is entered in follows from
 // its numeric type; a type that has no table is passed to the library all the same, and nothing is entered. Return codes
 // are reported against the environment: the one named or, when freeing, the one the object was made from.
+#include <cstdint>
 #include <cstring>
 #include <optional>
 
@@ -78,9 +79,9 @@ class DescriptorArray {
 public:
     // False after a failed allocation, which has been complained about.
     bool Allocate(ub4 count) {
-        constexpr ub4 kMost = 1u << 24;  // no script means more; what asks for more is told that there is no memory
+        constexpr ub4 kMost = 1u << 24;  // no script means more; what asks for more finds no memory
         if (count == 0) return true;
-        if (count <= kMost) array_.reset(static_cast<void**>(GetMem(count * sizeof(void*))));
+        array_.reset(static_cast<void**>(GetMem(count <= kMost ? count * sizeof(void*) : SIZE_MAX)));
         if (array_ == nullptr) Message(kOutput, "Could not allocate memory\n");
         return array_ != nullptr;
     }

@@ -7,8 +7,8 @@
 // "pointer".
 //
 // PROBE_ANSWERS names a file of answers, a line each: FUNCTION RESULT [POSITION=TYPE:VALUE]...; what stands at POSITION,
-// counted from 1, is an output to fill: TYPE is i1, i2, i4, i8 for integers by width, t for a terminated text, f8 for a
-// double. Answers for a function are used in order, the last one again and again; without any the result is 0. A result
+// counted from 1, is an output to fill: TYPE is i1, i2, i4, i8 for integers by width, t for a terminated text, p for a
+// pointer to one, f8 for a double. Answers for a function are used in order, the last one again and again; without any the result is 0. A result
 // of 0 hands out a new object through the first pointer to a pointer.
 #include <algorithm>
 #include <cstdio>
@@ -154,6 +154,12 @@ void Store(const void* place, Value value) {
     std::memcpy(const_cast<void*>(place), &value, sizeof value);
 }
 
+// A copy that stays where it is.
+const char* KeepText(const std::string& text) {
+    static auto* const kept = new std::deque<std::string>;
+    return kept->emplace_back(text).c_str();
+}
+
 void Fill(const Output& output, const std::vector<Argument>& arguments) {
     if (output.position == 0 || output.position > arguments.size()) return;
     const void* place = arguments[output.position - 1].address;
@@ -163,6 +169,7 @@ void Fill(const Output& output, const std::vector<Argument>& arguments) {
     else if (output.type == "i4") Store(place, static_cast<int>(std::stoll(output.value)));
     else if (output.type == "i8") Store(place, std::stoll(output.value));
     else if (output.type == "f8") Store(place, std::stod(output.value));
+    else if (output.type == "p") Store(place, KeepText(output.value));
     else std::memcpy(const_cast<void*>(place), output.value.c_str(), output.value.size() + 1);
 }
 
