@@ -12,8 +12,7 @@ namespace number {
 namespace {
 
 constexpr int kMostPower = 200;  // from the last digit of the smallest number to the units, and some more
-constexpr int kFractionBits = 64;  // behind the last digit, when a rounding is decided
-constexpr mpfr_prec_t kScaledPrecision = 216;  // 40 digits, the fraction and some more
+constexpr mpfr_prec_t kDigitBits = 133;  // 100^20 < 2^133
 
 // 10^i, exact; made once and only read afterwards.
 const Real& PowerOfTen(int i) {
@@ -36,11 +35,13 @@ void Scale(const Real& from, int power, mpfr_rnd_t rounding, Real* to) {
 
 class Integer {
 public:
-    Integer() { mpz_init2(value_, 320); }
+    explicit Integer(mp_size_t limbs) { mpz_init2(value_, static_cast<mp_bitcnt_t>(limbs) * 64); }
     ~Integer() { mpz_clear(value_); }
     Integer(const Integer&) = delete;
     Integer& operator=(const Integer&) = delete;
     operator mpz_ptr() { return value_; }
+    [[nodiscard]] const mp_limb_t* Limbs() const { return mpz_limbs_read(value_); }
+    [[nodiscard]] mp_size_t Count() const { return static_cast<mp_size_t>(mpz_size(value_)); }
 
 private:
     mpz_t value_;
@@ -61,6 +62,33 @@ int EstimateExponent(const Real& real) {
     const double mantissa = mpfr_get_d_2exp(&binary, real, MPFR_RNDZ);
     constexpr double kLog100Of2 = 0.150514997831990598;
     return static_cast<int>(std::floor((static_cast<double>(binary) + std::log2(std::fabs(mantissa))) * kLog100Of2));
+}
+
+// Takes 39 or 40 digits, which fill the first 20 places; false with the direction to go when they are more or fewer.
+bool TakeWhole(const mp_limb_t* limbs, mp_size_t count, Digits* digits, int* step) {
+    mp_limb_t whole[3] = {};
+    for (mp_size_t i = 0; i < count && i < 3; ++i) whole[i] = limbs[i];
+    const std::uint64_t low = mpn_divrem_1(whole, 0, whole, 3, kLimb);
+    const std::uint64_t middle = mpn_divrem_1(whole, 0, whole, 3, kLimb);
+    constexpr std::uint64_t kHalfLimb = 100'000'000;
+    *step = count > 3 || whole[1] != 0 || whole[0] >= kHalfLimb ? 1 : whole[0] < kHalfLimb / 100 ? -1 : 0;
+    if (*step != 0) return false;
+    digits->words[0] = WordOfLimb(whole[0] * kHalfLimb + middle / kHalfLimb);
+    digits->words[1] = WordOfLimb(middle % kHalfLimb * kHalfLimb + low / kHalfLimb);
+    digits->words[2] = WordOfLimb(low % kHalfLimb * kHalfLimb);
+    return true;
+}
+
+// How many bits the distance of a binary fraction from one half has.
+mpfr_prec_t DistanceFromHalf(const mp_limb_t* fraction, mp_size_t count) {
+    constexpr mp_limb_t kTop = mp_limb_t{1} << 63;
+    const bool above = (fraction[count - 1] & kTop) != 0;
+    for (mp_size_t i = count; i-- > 0;) {
+        mp_limb_t limb = above ? fraction[i] : ~fraction[i];
+        if (i == count - 1) limb &= ~kTop;
+        if (limb != 0) return i * 64 + static_cast<mpfr_prec_t>(std::bit_width(limb));
+    }
+    return 0;
 }
 
 }  // namespace
@@ -92,49 +120,28 @@ mpfr_exp_t RoughExponent(const Digits& digits) {
 }
 
 bool ToDigits(const Real& real, mpfr_prec_t good_bits, bool tie, Digits* digits) {
-    constexpr mpfr_prec_t kDigitBits = 133;  // 100^20 < 2^133
     if (good_bits < kDigitBits + 12) return false;
-    Real scaled(kScaledPrecision);
-    Integer value;
-    int exponent = EstimateExponent(real);
-    for (;;) {
+    const mp_size_t fraction_limbs = std::max<mpfr_prec_t>((good_bits - kDigitBits) / 64, 1);
+    const mpfr_prec_t fraction_bits = 64 * fraction_limbs;
+    Real scaled(kDigitBits + fraction_bits + 16);
+    Integer value(fraction_limbs + 4);
+    Digits found;
+    found.negative = mpfr_signbit(static_cast<mpfr_srcptr>(real)) != 0;
+    found.exponent = EstimateExponent(real);
+    for (int step = 1; step != 0; found.exponent += step) {
         // Toward zero, so that a wrong exponent shows as one, whatever is cut.
-        Scale(real, 2 * (kMantissaDigits - 1 - exponent), MPFR_RNDZ, &scaled);
-        mpfr_mul_2ui(scaled, scaled, kFractionBits, MPFR_RNDN);
+        Scale(real, 2 * (kMantissaDigits - 1 - found.exponent), MPFR_RNDZ, &scaled);
+        mpfr_mul_2si(scaled, scaled, fraction_bits, MPFR_RNDZ);
         mpfr_get_z(value, scaled, MPFR_RNDZ);
-        mpz_abs(value, value);
-        const mp_size_t size = static_cast<mp_size_t>(mpz_size(value));
-        // The fraction fills the lowest limb; above it stand 39 or 40 digits, if the exponent was right.
-        mp_limb_t whole[4] = {};
-        const mp_limb_t* limbs = mpz_limbs_read(value);
-        for (mp_size_t i = 1; i < size && i <= 3; ++i) whole[i - 1] = limbs[i];
-        const std::uint64_t fraction = size > 0 ? limbs[0] : 0;
-        Digits found;
-        const std::uint64_t low = mpn_divrem_1(whole, 0, whole, 3, kLimb);
-        const std::uint64_t middle = mpn_divrem_1(whole, 0, whole, 3, kLimb);
-        if (size > 4 || whole[1] != 0 || whole[0] >= 100'000'000) {
-            ++exponent;
-            continue;
-        }
-        if (whole[0] < 1'000'000) {
-            --exponent;
-            continue;
-        }
-        // 8 + 16 + 16 digits: moved to the front they fill the first 20 places.
-        found.words[0] = WordOfLimb(whole[0] * 100'000'000 + middle / 100'000'000);
-        found.words[1] = WordOfLimb(middle % 100'000'000 * 100'000'000 + low / 100'000'000);
-        found.words[2] = WordOfLimb(low % 100'000'000 * 100'000'000);
-        found.exponent = exponent;
-        found.negative = mpfr_sgn(static_cast<mpfr_srcptr>(real)) < 0;
-        constexpr std::uint64_t kHalf = 1ull << (kFractionBits - 1);
-        const mpfr_prec_t doubt_bits = std::max<mpfr_prec_t>(kDigitBits + kFractionBits - good_bits, 0) + 2;
-        const std::uint64_t distance = fraction < kHalf ? kHalf - fraction : fraction - kHalf;
-        const bool certain = distance >> doubt_bits != 0;
-        if (!certain && !tie) return false;
-        if (certain ? fraction >= kHalf : tie) Increment(&found, kMantissaDigits - 1);
-        *digits = found;
-        return true;
+        TakeWhole(value.Limbs() + fraction_limbs, value.Count() - fraction_limbs, &found, &step);
     }
+    const mpfr_prec_t doubt_bits = std::max<mpfr_prec_t>(kDigitBits + fraction_bits - good_bits, 0) + 3;
+    const bool certain = DistanceFromHalf(value.Limbs(), fraction_limbs) > doubt_bits;
+    if (!certain && !tie) return false;
+    const bool above_half = value.Limbs()[fraction_limbs - 1] >> 63 != 0;
+    if (above_half || !certain) Increment(&found, kMantissaDigits - 1);
+    *digits = found;
+    return true;
 }
 
 }  // namespace number

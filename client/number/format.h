@@ -22,7 +22,8 @@ struct Nls {
 // point into `text` or at constants. kBadNls leaves *nls in no particular state.
 Errno ParseNls(std::string_view text, Nls* nls) noexcept;
 
-// Writes the text of a number. *length is set on success, and on kBufferTooSmall to the size that is needed.
+// Writes the text of a number. *length is set on success, and on kBufferTooSmall to the size that is needed; the area
+// holds the beginning of the text then.
 Errno ToText(const OCINumber& value, std::string_view model, const Nls& nls, char* text, std::size_t capacity,
              std::size_t* length) noexcept;
 

@@ -8,44 +8,28 @@ namespace {
 constexpr int kMostPlaces = 40;       // of the fixed form
 constexpr int kHugeExponent = 10'000'000;
 
-// Writes one run of characters after another; the caller's room is known to be enough.
-class Writer {
-public:
-    explicit Writer(char* text) : start_(text), at_(text) {}
-    void Put(char c) { *at_++ = c; }
-    void Put(std::string_view run) {
-        std::memcpy(at_, run.data(), run.size());
-        at_ += run.size();
-    }
-    void Zeros(int count) {
-        for (; count > 0; --count) Put('0');
-    }
-    [[nodiscard]] std::size_t Length() const { return static_cast<std::size_t>(at_ - start_); }
+}  // namespace
 
-private:
-    char* start_;
-    char* at_;
-};
+int FixedPlaces(const Decimal& value) {
+    return std::max(value.point, value.count) - std::min(value.point, 0);
+}
 
 void PutFixed(const Decimal& value, char decimal, Writer* out) {
+    if (value.count == 0) {
+        out->Put('0');
+        return;
+    }
     const std::string_view digits = value.Text();
     const auto whole = static_cast<std::size_t>(std::clamp(value.point, 0, value.count));
     out->Put(digits.substr(0, whole));
-    out->Zeros(value.point - value.count);
+    out->Repeat('0', value.point - value.count);
     if (value.point >= value.count) return;
     out->Put(decimal);
-    out->Zeros(-value.point);
+    out->Repeat('0', -value.point);
     out->Put(digits.substr(whole));
 }
 
-void PutScientific(const Decimal& value, char decimal, Writer* out) {
-    const std::string_view digits = value.Text();
-    out->Put(digits.front());
-    if (digits.size() > 1) {
-        out->Put(decimal);
-        out->Put(digits.substr(1));
-    }
-    int exponent = value.point - 1;
+void PutExponent(int exponent, Writer* out) {
     out->Put('E');
     out->Put(exponent < 0 ? '-' : '+');
     exponent = exponent < 0 ? -exponent : exponent;
@@ -54,25 +38,23 @@ void PutScientific(const Decimal& value, char decimal, Writer* out) {
     out->Put(static_cast<char>('0' + exponent % 10));
 }
 
-// Digits with a point in them, as one run: what stands before the point may hold leading zeros.
-struct Mantissa {
-    char kept[2 * kUnpackedDigits];  // from the first digit that is not 0
-    std::size_t count = 0;
-    int point = 0;                   // of `kept`
-    bool any = false;
-};
+void PutScientific(const Decimal& value, char decimal, Writer* out) {
+    const std::string_view digits = value.count > 0 ? value.Text() : "0";
+    out->Put(digits.front());
+    if (digits.size() > 1) {
+        out->Put(decimal);
+        out->Put(digits.substr(1));
+    }
+    PutExponent(value.count > 0 ? value.point - 1 : 0, out);
+}
 
-bool IsDigit(char c) { return c >= '0' && c <= '9'; }
+namespace {
 
-const char* ReadMantissa(const char* at, const char* end, char decimal, Mantissa* mantissa) {
+const char* ReadMantissa(const char* at, const char* end, char decimal, DigitReader* digits) {
     bool after_point = false;
     for (; at != end; ++at) {
         if (IsDigit(*at)) {
-            mantissa->any = true;
-            const bool significant = mantissa->count > 0 || *at != '0';
-            if (significant && mantissa->count < sizeof mantissa->kept) mantissa->kept[mantissa->count++] = *at;
-            if (after_point) mantissa->point -= !significant;
-            else mantissa->point += significant;
+            digits->Add(*at, after_point);
         } else if (*at == decimal && !after_point) {
             after_point = true;
         } else {
@@ -81,6 +63,8 @@ const char* ReadMantissa(const char* at, const char* end, char decimal, Mantissa
     }
     return at;
 }
+
+}  // namespace
 
 // Reads E, sign and digits; leaves *exponent and the position alone when digits are missing.
 const char* ReadExponent(const char* at, const char* end, int* exponent) {
@@ -95,6 +79,8 @@ const char* ReadExponent(const char* at, const char* end, int* exponent) {
     return digit;
 }
 
+namespace {
+
 const char* SkipBlanks(const char* at, const char* end) {
     while (at != end && (*at == ' ' || (*at >= '\t' && *at <= '\r'))) ++at;
     return at;
@@ -107,13 +93,13 @@ bool ReadPlain(std::string_view text, char decimal, OCINumber* result, Errno* er
     const char* at = SkipBlanks(text.data(), end);
     const bool negative = at != end && *at == '-';
     if (at != end && (*at == '-' || *at == '+')) ++at;
-    Mantissa mantissa;
-    at = ReadMantissa(at, end, decimal, &mantissa);
-    if (!mantissa.any) return false;
+    DigitReader digits;
+    at = ReadMantissa(at, end, decimal, &digits);
+    if (!digits.Any()) return false;
     int exponent = 0;
     at = ReadExponent(at, end, &exponent);
     if (SkipBlanks(at, end) != end) return false;
-    *error = FromDecimal({mantissa.kept, mantissa.count}, mantissa.point + exponent, negative, result);
+    *error = digits.Finish(exponent, negative, result);
     return true;
 }
 
@@ -126,18 +112,15 @@ Errno FromPlainText(std::string_view text, char decimal, OCINumber* result) noex
 
 Errno ToPlainText(const OCINumber& value, char decimal, char* text, std::size_t* length) noexcept {
     Digits digits;
-    Writer out(text);
+    Writer out(text, kMaxPlainText);
     if (const Errno error = Unpack(value, &digits)) {
         if (error == kBadNumber) return error;
         if (value.OCINumberPart[1] == 0) out.Put('-');
         out.Put('~');
-    } else if (digits.IsZero()) {
-        out.Put('0');
     } else {
         const Decimal number = ToDecimal(digits);
-        const int places = std::max(number.point, number.count) - std::min(number.point, 0);
         if (number.negative) out.Put('-');
-        if (places > kMostPlaces) PutScientific(number, decimal, &out);
+        if (FixedPlaces(number) > kMostPlaces) PutScientific(number, decimal, &out);
         else PutFixed(number, decimal, &out);
     }
     *length = out.Length();
