@@ -176,6 +176,12 @@ TEST_F(EngineTest, NumbersKeepEveryDigit) {
     }
 }
 
+TEST_F(EngineTest, LongLiteralsKeepEveryDigit) {
+    ASSERT_EQ(Run("create table t(n number)"), 0);
+    ASSERT_EQ(Run("insert into t values(-123456789012345678901234567890.5), (1), (12345678901234567890)"), 0);
+    EXPECT_EQ(Query("select n from t"), "decimal -123456789012345678901234567890.5;1;decimal 12345678901234567890;");
+}
+
 TEST_F(EngineTest, ValuesComeBackAsTheirColumnsAreDeclared) {
     ASSERT_EQ(Run("create table t(c char(4), v varchar2(10), d date, r raw(4), b blob, i integer)"), 0);
     Rows rows{{Text("ab"), Text("ab"), Text("2024-02-29 12:00:00"), Bytes(Kind::bytes, "xy"), Null(), Integer(7)}};
@@ -183,6 +189,49 @@ TEST_F(EngineTest, ValuesComeBackAsTheirColumnsAreDeclared) {
     ASSERT_TRUE(Prepare("insert into t values(?1, ?2, ?3, ?4, ?5, ?6)")->ExecuteArray(rows, 0, 1, false, outcome).Ok());
     EXPECT_EQ(Query("select * from t"), "ab  ,ab,time 2024-02-29 12:00:00,bytes 2,null,7;");
     EXPECT_EQ(Query("select t.rowid, count(*) from t"), "row 1,1;");
+}
+
+// The same value through a placeholder, as a literal, from a query and by an update.
+TEST_F(EngineTest, ColumnsTakeWhatTheirDeclarationSays) {
+    ASSERT_EQ(Run("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
+                  "s timestamp, r raw(2), x kelp_decfloat(16), b clob)"), 0);
+    const struct { const char* column; const char* literal; const char* outcome; } cases[] = {
+        {"n", "'12.345'", "real 12.35"}, {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"}, {"n", "-1000", "error 1438"},
+        {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"}, {"n", "''", "null"}, {"n", "1.005e2", "real 100.5"},
+        {"w", "12345", "12300"}, {"w", "99950", "error 1438"}, {"i", "2.5", "3"}, {"i", "' 12 '", "12"},
+        {"f", "'123456789012345678901234567890.5'", "decimal 123456789012345678901234567890.5"}, {"f", "1e300", "error 1426"},
+        {"v", "'abc'", "abc"}, {"v", "'abcd'", "error 12899"}, {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"}, {"v", "12", "12"},
+        {"c", "'ab  '", "ab  "}, {"c", "'abcde'", "error 12899"}, {"c", "'abcd   '", "abcd"},
+        {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"}, {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"},
+        {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"}, {"d", "'30-FEB-24'", "error 1839"}, {"d", "'x'", "error 1858"},
+        {"d", "5", "error 932"}, {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"},
+        {"r", "'0aFF'", "bytes 2"}, {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 2"},
+        {"x", "'1.23456789012345678'", "decimal 1.234567890123457"}, {"b", "'any text at all'", "any text at all"},
+        {"n", "null", "null"}};
+    for (const auto& c : cases) {
+        const std::string column = c.column;
+        const std::string literal = c.literal;
+        const std::string want = std::string(c.outcome) + ';';
+        const auto outcome = [&](int error) {
+            return error ? "error " + std::to_string(error) + ';' : Query("select " + column + " from t");
+        };
+        const auto fresh = [&](const char* row) {
+            ASSERT_EQ(Run("delete from t"), 0);
+            ASSERT_EQ(Run(row), 0);
+        };
+        fresh("select 1");
+        EXPECT_EQ(outcome(Run("insert into main.t(" + column + ") values(" + literal + ")")), want) << literal;
+        fresh("select 1");
+        EXPECT_EQ(outcome(Run("insert into t(" + column + ") select " + literal + " where 1 = 1")), want) << "query " << literal;
+        fresh("insert into t(n) values(null)");
+        EXPECT_EQ(outcome(Run("update t set r = null, " + column + " = " + literal + " where 1 = 1")), want) << "update " << literal;
+        if (literal.front() != '\'') continue;
+        fresh("select 1");
+        Rows rows{{Text(std::string_view(literal).substr(1, literal.size() - 2))}};
+        engine::ArrayOutcome bound;
+        ASSERT_TRUE(Prepare("insert into t(" + column + ") values(?1)")->ExecuteArray(rows, 0, 1, false, bound).Ok());
+        EXPECT_EQ(outcome(bound.failures.empty() ? 0 : bound.failures[0].status.Number()), want) << "bound " << literal;
+    }
 }
 
 TEST_F(EngineTest, ColumnsAreDescribed) {

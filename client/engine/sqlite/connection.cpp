@@ -4,6 +4,7 @@
 #include <thread>
 
 #include "engine/sqlite/accounts.h"
+#include "engine/sqlite/assignments.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/functions.h"
 #include "engine/sqlite/query.h"
@@ -20,6 +21,7 @@ constexpr int kNotProperlyEnded = 933;
 constexpr int kNoStatement = 900;
 constexpr int kStatementTooLong = 1489;
 constexpr int kRolledBack = 2091;
+constexpr std::size_t kLongestStatement = 1000000000;
 
 // Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
 constexpr Dialect::Spelling kTypes[] = {
@@ -80,30 +82,42 @@ Status SqliteConnection::ChangePassword(const std::string& user, const std::stri
 }
 
 Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& query, std::uint32_t& error_offset) {
-    if (sql.size() > 1000000000) return Error(kStatementTooLong).From("SQLITE");
+    if (sql.size() > kLongestStatement) return Error(kStatementTooLong).From("SQLITE");
     sqlite3* database = database_.get();
-    sqlite3_stmt* compiled = nullptr;
-    const char* rest = nullptr;
-    const int code = sqlite3_prepare_v3(database, sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
-                                        &compiled, &rest);
-    StatementHandle statement(compiled);
+    int code = SQLITE_OK;
+    std::size_t end = 0;
+    StatementHandle statement = Compile(sql, code, &end);
     if (code != SQLITE_OK) {
         const int offset = sqlite3_error_offset(database);
         if (offset >= 0) error_offset = static_cast<std::uint32_t>(offset);
         return Failure(database, code);
     }
     if (!statement) return Error(kNoStatement).From("SQLITE");
-
-    sqlite3_stmt* another = nullptr;
-    const std::string_view left = sql.substr(static_cast<std::size_t>(rest - sql.data()));
-    const int rest_code = sqlite3_prepare_v3(database, left.data(), static_cast<int>(left.size()), 0, &another, nullptr);
-    sqlite3_finalize(another);
-    if (rest_code != SQLITE_OK || another) {
-        error_offset = static_cast<std::uint32_t>(sql.size() - left.size());
+    if (Compile(sql.substr(end), code, nullptr) || code != SQLITE_OK) {
+        error_offset = static_cast<std::uint32_t>(end);
         return Error(kNotProperlyEnded).From("SQLITE");
     }
-    query = std::make_unique<SqliteQuery>(*this, std::move(statement), sql);
+
+    const Assignments assignments = FindAssignments(database, sql);
+    if (!assignments.sql.empty()) {
+        StatementHandle checked = Compile(assignments.sql, code, nullptr);
+        if (code != SQLITE_OK) return Failure(database, code);
+        statement = std::move(checked);
+    }
+    auto made = std::make_unique<SqliteQuery>(*this, std::move(statement), sql);
+    for (const auto& parameter : assignments.parameters) made->StoreInto(parameter.index, parameter.column);
+    query = std::move(made);
     return {};
+}
+
+// `end` tells where the statement ends in the text. None for a text without a statement.
+StatementHandle SqliteConnection::Compile(std::string_view sql, int& code, std::size_t* end) {
+    sqlite3_stmt* compiled = nullptr;
+    const char* rest = nullptr;
+    code = sqlite3_prepare_v3(database_.get(), sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT, &compiled,
+                              &rest);
+    if (end && rest) *end = static_cast<std::size_t>(rest - sql.data());
+    return StatementHandle(compiled);
 }
 
 Status SqliteConnection::Begin() {

@@ -63,6 +63,7 @@ private:
     static int OnProgress(void* self);
     static int OnBusy(void* self, int attempts);
     static void OnChange(void* self, int operation, const char* schema, const char* table, sqlite3_int64 row);
+    StatementHandle Compile(std::string_view sql, int& code, std::size_t* end);
     Status Run(const char* sql);
     std::string Text(const char* sql);    // the first column of the first row
 

@@ -1,9 +1,7 @@
 #include "engine/sqlite/describe.h"
 
-#include <algorithm>
-#include <cctype>
-
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/stored_number.h"
 #include "oci.h"
@@ -14,11 +12,6 @@ namespace {
 constexpr std::int8_t kFloating = -127;
 constexpr std::uint32_t kNumberSize = 22;
 constexpr std::uint32_t kRowIdSize = 18;
-
-bool EqualsWord(std::string_view word, std::string_view lower) {
-    return std::equal(word.begin(), word.end(), lower.begin(), lower.end(),
-                      [](char a, char b) { return std::tolower(static_cast<unsigned char>(a)) == b; });
-}
 
 void MakeNumber(Column& column) {
     column.type = SQLT_NUM;
@@ -71,10 +64,20 @@ void DescribeItem(const SelectItem& item, Column& column, bool& typed) {
 }  // namespace
 
 Verb VerbOf(std::string_view sql) {
-    const std::string_view word = FirstWord(sql);
-    if (EqualsWord(word, "insert") || EqualsWord(word, "replace")) return Verb::insert;
-    if (EqualsWord(word, "update")) return Verb::update;
-    if (EqualsWord(word, "delete")) return Verb::remove;
+    Pieces pieces(sql);
+    int depth = 0;
+    bool with = false;    // with ... (...) insert: the verb comes later
+    for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
+        if (piece == "(") ++depth;
+        if (piece == ")") --depth;
+        if (depth > 0 || piece == ")") continue;
+        if (IsWord(piece, "insert") || IsWord(piece, "replace")) return Verb::insert;
+        if (IsWord(piece, "update")) return Verb::update;
+        if (IsWord(piece, "delete")) return Verb::remove;
+        if (!with && !IsWord(piece, "with")) return Verb::other;
+        if (IsWord(piece, "select")) return Verb::other;
+        with = true;
+    }
     return Verb::other;
 }
 

@@ -11,7 +11,7 @@
 
 namespace engine::sqlite {
 
-// What a statement does to rows, by its first word.
+// What a statement does to rows, by its first word, or by the one behind with ...
 Verb VerbOf(std::string_view sql);
 
 // Describes the columns of a compiled statement. `untyped` says which ones only a value can tell more about.

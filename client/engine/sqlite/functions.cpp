@@ -1,9 +1,13 @@
 #include "engine/sqlite/functions.h"
 
+#include <algorithm>
 #include <array>
+#include <memory>
 #include <string>
 
 #include "date/date.h"
+#include "engine/sqlite/coercion.h"
+#include "engine/sqlite/column_types.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/stored_number.h"
 #include "number/number.h"
@@ -30,6 +34,12 @@ std::string_view TextOf(sqlite3_value* value) {
     return {text ? text : "", static_cast<std::size_t>(sqlite3_value_bytes(value))};
 }
 
+void SetBytes(Datum& datum, Kind kind, std::string_view bytes) {
+    datum.kind = kind;
+    datum.data = bytes.data();
+    datum.length = static_cast<std::uint32_t>(bytes.size());
+}
+
 // Any value as a number: 0 or an error number.
 int ReadNumber(sqlite3_value* value, OCINumber& number) {
     switch (sqlite3_value_type(value)) {
@@ -50,30 +60,55 @@ void ReturnNumber(sqlite3_context* context, const OCINumber& number) {
     }
 }
 
-// Whether the value needs more digits before the point than `precision` and `scale` leave.
-bool Exceeds(const OCINumber& number, int precision, int scale) {
-    OCINumber one;
-    OCINumber limit;
-    OCINumber size;
-    int compared = 0;
-    number::FromInt64(1, &one);
-    if (number::Shift(one, precision - scale, &limit) != 0 || number::Abs(number, &size) != 0) return false;
-    return number::Compare(size, limit, &compared) == 0 && compared >= 0;
+Datum ReadDatum(sqlite3_value* value, OCINumber& number) {
+    Datum datum;
+    const std::string_view bytes = sqlite3_value_type(value) == SQLITE_TEXT ? TextOf(value) : Bytes(value);
+    switch (sqlite3_value_type(value)) {
+        case SQLITE_INTEGER:
+            datum.kind = Kind::integer;
+            datum.integer = sqlite3_value_int64(value);
+            break;
+        case SQLITE_FLOAT:
+            datum.kind = Kind::real;
+            datum.real = sqlite3_value_double(value);
+            break;
+        case SQLITE_TEXT: SetBytes(datum, Kind::text, bytes); break;
+        case SQLITE_BLOB:
+            if (ReadNumberBlob(bytes, number)) SetBytes(datum, Kind::decimal, {reinterpret_cast<char*>(&number), sizeof number});
+            else SetBytes(datum, Kind::bytes, bytes);
+            break;
+        default: break;
+    }
+    return datum;
+}
+
+void ReturnDatum(sqlite3_context* context, const Datum& datum) {
+    switch (datum.kind) {
+        case Kind::integer: return sqlite3_result_int64(context, datum.integer);
+        case Kind::real: return sqlite3_result_double(context, datum.real);
+        case Kind::decimal: return ReturnNumber(context, *static_cast<const OCINumber*>(datum.data));
+        case Kind::text:
+        case Kind::timestamp:
+            return sqlite3_result_text64(context, datum.length ? datum.Text().data() : "", datum.length, SQLITE_TRANSIENT,
+                                         SQLITE_UTF8);
+        case Kind::bytes: return sqlite3_result_blob64(context, datum.length ? datum.data : "", datum.length, SQLITE_TRANSIENT);
+        default: return sqlite3_result_null(context);
+    }
 }
 
 // number(x), number(x, precision), number(x, precision, scale)
 void ToNumber(sqlite3_context* context, int count, Arguments arguments) {
-    if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
     OCINumber number;
-    int failure = ReadNumber(arguments[0], number);
-    if (failure == 0 && count > 1) {
-        const int precision = sqlite3_value_int(arguments[1]);
-        const int scale = count > 2 ? sqlite3_value_int(arguments[2]) : 0;
-        failure = number::Round(number, scale, &number);
-        if (failure == 0 && Exceeds(number, precision, scale)) failure = 1438;
-    }
-    if (failure != 0) return Refuse(context, failure);
-    ReturnNumber(context, number);
+    Datum value = ReadDatum(arguments[0], number);
+    Column column;
+    ReadDeclaredType("number", column);
+    if (count > 1) column.precision = static_cast<std::uint8_t>(std::clamp(sqlite3_value_int(arguments[1]), 1, 38));
+    if (count > 1) column.scale = 0;
+    if (count > 2) column.scale = static_cast<std::int8_t>(std::clamp(sqlite3_value_int(arguments[2]), -84, 126));
+    Coercion coercion(std::move(column));
+    const Status status = coercion.Apply(value);
+    if (status.Failed()) Refuse(context, status.Number());
+    else ReturnDatum(context, value);
 }
 
 // decfloat(x), decfloat(x, digits): rounded to 34 or 16 digits
@@ -163,6 +198,26 @@ void Now(sqlite3_context* context, int, Arguments) {
     ReturnDate(context, now);
 }
 
+// store(x, 'declared type'): what a column of that type takes, or refuses. The type is read once a statement.
+void Store(sqlite3_context* context, int, Arguments arguments) {
+    auto* coercion = static_cast<Coercion*>(sqlite3_get_auxdata(context, 1));
+    std::unique_ptr<Coercion> made;
+    if (!coercion) {
+        Column column;
+        if (!ReadDeclaredType(TextOf(arguments[1]), column)) return sqlite3_result_value(context, arguments[0]);
+        made = std::make_unique<Coercion>(std::move(column));
+        coercion = made.get();
+    }
+    OCINumber number;
+    Datum value = ReadDatum(arguments[0], number);
+    const Status status = coercion->Apply(value);
+    if (status.Failed()) Refuse(context, status.Number());
+    else ReturnDatum(context, value);
+    if (made) {
+        sqlite3_set_auxdata(context, 1, made.release(), [](void* kept) { delete static_cast<Coercion*>(kept); });
+    }
+}
+
 struct FunctionRow {
     const char* name;
     int least;    // arguments
@@ -178,6 +233,7 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_char", 1, 2, SQLITE_DETERMINISTIC, ToText<true>},
     {"kelp_date", 1, 1, SQLITE_DETERMINISTIC, ToDate<true>},
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
+    {"kelp_store", 2, 2, SQLITE_DETERMINISTIC, Store},
     {"kelp_sysdate", 0, 0, 0, Now<true>},
     {"kelp_systimestamp", 0, 0, 0, Now<false>},
 };

@@ -22,9 +22,13 @@ int Length(const Datum& value) { return static_cast<int>(value.length); }
 SqliteQuery::SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql)
     : connection_(connection), statement_(std::move(statement)), sql_(sql), verb_(VerbOf(sql_)),
       changes_rows_(verb_ != Verb::other), read_only_(sqlite3_stmt_readonly(statement_.get()) != 0),
-      parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))) {}
+      parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))), coercions_(parameters_.size()) {}
 
 SqliteQuery::~SqliteQuery() { Close(); }
+
+void SqliteQuery::StoreInto(std::size_t parameter, const Column& column) {
+    if (parameter < coercions_.size()) coercions_[parameter] = std::make_unique<Coercion>(column);
+}
 
 const std::vector<Column>& SqliteQuery::Columns() {
     const int count = sqlite3_column_count(statement_.get());
@@ -95,7 +99,8 @@ Status SqliteQuery::BindRow(RowSource& source, std::uint32_t row, bool copy) {
     if (parameters_.empty()) return {};
     Status status = source.Row(row, parameters_);
     for (std::size_t index = 0; index < parameters_.size() && status.Ok(); ++index) {
-        status = Bind(static_cast<int>(index) + 1, parameters_[index], copy);
+        if (coercions_[index]) status = coercions_[index]->Apply(parameters_[index]);
+        if (status.Ok()) status = Bind(static_cast<int>(index) + 1, parameters_[index], copy);
     }
     return status;
 }

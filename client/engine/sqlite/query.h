@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "engine/engine.h"
+#include "engine/sqlite/coercion.h"
 #include "engine/sqlite/connection.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/row_store.h"
@@ -17,6 +18,8 @@ namespace engine::sqlite {
 class SqliteQuery final : public Query {
 public:
     SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql);
+    // The placeholder's values are stored into the column.
+    void StoreInto(std::size_t parameter, const Column& column);
     ~SqliteQuery() override;
     SqliteQuery(const SqliteQuery&) = delete;
     SqliteQuery& operator=(const SqliteQuery&) = delete;
@@ -62,6 +65,7 @@ private:
     bool read_only_;
     State state_ = State::closed;
     std::vector<Datum> parameters_;
+    std::vector<std::unique_ptr<Coercion>> coercions_;    // by parameter; null where nothing is to be done
     std::vector<Column> columns_;
     std::vector<bool> untyped_;          // columns whose type only a value tells
     std::vector<Reading> readings_;      // one a column, once described

@@ -15,7 +15,4 @@ struct SelectItem {
 // One item a column; none when the text is no query whose list can be told, as with "*".
 std::vector<SelectItem> ReadSelectList(std::string_view sql);
 
-// The first word behind blanks, comments and parentheses.
-std::string_view FirstWord(std::string_view sql);
-
 }  // namespace engine::sqlite

@@ -1,0 +1,227 @@
+#include "engine/sqlite/coercion.h"
+
+#include <cmath>
+#include <cstring>
+
+#include "date/format.h"
+#include "engine/sqlite/column_types.h"
+#include "number/number.h"
+
+namespace engine::sqlite {
+namespace {
+
+constexpr int kInconsistentTypes = 932;
+constexpr int kNumericOverflow = 1426;
+constexpr int kAbovePrecision = 1438;
+constexpr int kBadHex = 1465;
+constexpr int kTooLarge = 12899;
+constexpr std::int8_t kFloating = -127;
+
+constexpr std::int64_t kPowersOfTen[] = {1,
+                                         10,
+                                         100,
+                                         1000,
+                                         10000,
+                                         100000,
+                                         1000000,
+                                         10000000,
+                                         100000000,
+                                         1000000000,
+                                         10000000000,
+                                         100000000000,
+                                         1000000000000,
+                                         10000000000000,
+                                         100000000000000,
+                                         1000000000000000,
+                                         10000000000000000,
+                                         100000000000000000,
+                                         1000000000000000000};
+constexpr int kMostPower = static_cast<int>(std::size(kPowersOfTen)) - 1;
+constexpr int kExactPower = 15;                        // powers of ten and products below are exact in a real
+constexpr double kLargestExact = 9007199254740992.0;   // 2^53
+constexpr double kLargestNumber = 1e126;               // what a number cannot hold any more
+
+void Set(Datum& value, Kind kind, const void* data, std::size_t length) {
+    value.kind = kind;
+    value.data = data;
+    value.length = static_cast<std::uint32_t>(length);
+}
+
+// Whether |value| has at most `digits` digits before the point.
+bool Fits(std::int64_t value, int digits) {
+    if (digits > kMostPower) return true;
+    if (digits < 0) return value == 0;
+    return value < kPowersOfTen[digits] && value > -kPowersOfTen[digits];
+}
+
+// A real that has no more than `scale` digits after the point, and fits, needs nothing done.
+bool IsPlainReal(double value, int precision, int scale) {
+    if (scale < 0 || scale > kExactPower || precision - scale < 0) return false;
+    const auto power = static_cast<double>(kPowersOfTen[scale]);
+    const double scaled = std::nearbyint(value * power);
+    if (!(std::fabs(scaled) < kLargestExact) || scaled / power != value) return false;
+    const int digits = precision - scale;
+    return digits > kMostPower || std::fabs(value) < static_cast<double>(kPowersOfTen[digits]);
+}
+
+bool ExceedsPrecision(const OCINumber& number, int digits) {
+    OCINumber one;
+    OCINumber limit;
+    OCINumber size;
+    int compared = -1;
+    number::FromInt64(1, &one);
+    if (number::Shift(one, digits, &limit) != 0 || number::Abs(number, &size) != 0) return false;
+    return number::Compare(size, limit, &compared) == 0 && compared >= 0;
+}
+
+int HexDigit(char c) {
+    if (c >= '0' && c <= '9') return c - '0';
+    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
+    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
+    return -1;
+}
+
+// The default model of the type, else the form in which dates are kept.
+int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
+    if (date::FromEngineText(text, &value) == 0 && value.month != 0) return 0;
+    const bool is_date = type == SQLT_DAT;
+    const std::string_view model = is_date                       ? date::kDateModel
+                                   : type == SQLT_TIMESTAMP_TZ ? date::kTimestampZoneModel
+                                                                 : date::kTimestampModel;
+    return date::FromText(text, model, date::kEnglish, is_date ? date::Scope::date : date::Scope::timestamp, &value);
+}
+
+}  // namespace
+
+bool Coercion::Concerns(const Column& column) {
+    switch (column.type) {
+        case SQLT_CHR:
+        case SQLT_BIN: return column.size > 0;
+        case SQLT_CLOB:
+        case SQLT_DBCLOB:
+        case SQLT_BLOB:
+        case SQLT_LBI:
+        case SQLT_FILE:
+        case SQLT_RDD: return false;
+        default: return true;
+    }
+}
+
+Status Coercion::Apply(Datum& value) {
+    if (value.kind == Kind::null) return {};
+    if (IsNumberType(column_.type) || column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) return ApplyNumber(value);
+    if (IsDateType(column_.type)) return ApplyDate(value);
+    if (column_.type == SQLT_BIN) return ApplyBytes(value);
+    return ApplyText(value);
+}
+
+Status Coercion::Refuse(int number) const {
+    return Error(number, column_.name.empty() ? std::string() : "column " + column_.name);
+}
+
+Status Coercion::ApplyNumber(Datum& value) {
+    switch (value.kind) {
+        case Kind::integer:
+        case Kind::real:
+        case Kind::decimal: return ApplyDigits(value);
+        case Kind::text: {
+            if (value.Text().empty()) {
+                value = {};
+                return {};
+            }
+            const int failure = number::FromPlainText(value.Text(), '.', &number_);
+            return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
+        }
+        default: return Refuse(kInconsistentTypes);
+    }
+}
+
+Status Coercion::ApplyDigits(Datum& value) {
+    const int precision = column_.precision;
+    const int scale = column_.scale;
+    const bool limited = scale != kFloating;
+    if (value.kind == Kind::decimal) return ApplyDecimal(*static_cast<const OCINumber*>(value.data), value);
+    if (value.kind == Kind::integer) {
+        if (!limited || (scale >= 0 && Fits(value.integer, precision - scale))) return {};
+        if (scale >= 0) return Refuse(kAbovePrecision);
+        number::FromInt64(value.integer, &number_);
+        return ApplyDecimal(number_, value);
+    }
+    if (column_.type == SQLT_NUM && !(std::fabs(value.real) < kLargestNumber)) return Refuse(kNumericOverflow);
+    if (!limited || IsPlainReal(value.real, precision, scale)) return {};
+    const int failure = number::FromDouble(value.real, &number_);
+    return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
+}
+
+Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {
+    if (!number::IsValid(number)) return Refuse(number::kInvalidNumber);
+    number_ = number;
+    int failure = 0;
+    if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) {
+        failure = number::Prec(number_, column_.precision, &number_);
+    } else if (column_.scale != kFloating) {
+        failure = number::Round(number_, column_.scale, &number_);
+        if (failure == 0 && ExceedsPrecision(number_, column_.precision - column_.scale)) failure = kAbovePrecision;
+    }
+    if (failure != 0) return Refuse(failure);
+    Set(value, Kind::decimal, &number_, sizeof number_);
+    return {};
+}
+
+Status Coercion::ApplyText(Datum& value) {
+    if (value.kind == Kind::decimal) {
+        std::size_t length = 0;
+        text_.resize(number::kMaxPlainText);
+        const int failure = number::ToPlainText(*static_cast<const OCINumber*>(value.data), '.', text_.data(), &length);
+        if (failure != 0) return Refuse(failure);
+        Set(value, Kind::text, text_.data(), length);
+    }
+    // Blanks at the end of a fixed column's text come back when it is read.
+    if (column_.type == SQLT_AFC && value.kind == Kind::text) {
+        while (value.length > 1 && value.Text().back() == ' ') --value.length;
+    }
+    return ApplySize(value);
+}
+
+Status Coercion::ApplyBytes(Datum& value) {
+    if (value.kind == Kind::text) {
+        const std::string_view digits = value.Text();
+        if (digits.size() % 2 != 0) return Refuse(kBadHex);
+        text_.clear();
+        for (std::size_t at = 0; at < digits.size(); at += 2) {
+            const int high = HexDigit(digits[at]);
+            const int low = HexDigit(digits[at + 1]);
+            if (high < 0 || low < 0) return Refuse(kBadHex);
+            text_.push_back(static_cast<char>(high * 16 + low));
+        }
+        Set(value, Kind::bytes, text_.data(), text_.size());
+    }
+    return value.kind == Kind::bytes ? ApplySize(value) : Refuse(kInconsistentTypes);
+}
+
+Status Coercion::ApplySize(const Datum& value) {
+    const bool has_length = value.kind == Kind::text || value.kind == Kind::bytes || value.kind == Kind::timestamp;
+    if (!has_length || column_.size == 0 || value.length <= column_.size) return {};
+    return Error(kTooLarge, "column " + column_.name + ", actual " + std::to_string(value.length) + ", maximum " +
+                                std::to_string(column_.size));
+}
+
+Status Coercion::ApplyDate(Datum& value) {
+    if (value.kind != Kind::text && value.kind != Kind::timestamp) return Refuse(kInconsistentTypes);
+    constexpr std::size_t kPlainDate = 19;    // "YYYY-MM-DD HH:MM:SS"
+    const std::string_view text = value.Text();
+    if (value.kind == Kind::timestamp && (column_.type != SQLT_DAT || text.size() == kPlainDate)) return {};
+    if (text.empty()) {
+        value = {};
+        return {};
+    }
+    date::DateTime read;
+    const int failure = ReadDate(text, column_.type, read);
+    if (failure != 0) return Refuse(failure);
+    if (column_.type == SQLT_DAT) read.nanosecond = 0;
+    if (column_.type == SQLT_DAT || column_.type == SQLT_TIMESTAMP) read.has_zone = false;
+    Set(value, Kind::timestamp, date_.data(), date::ToEngineText(read, date_.data()));
+    return {};
+}
+
+}  // namespace engine::sqlite

@@ -1,0 +1,40 @@
+// What a column's declaration makes of a value that is stored into it: numbers from text, rounded to the scale; dates from
+// text; texts and bytes that must fit. SQLite itself stores anything anywhere.
+#pragma once
+
+#include <array>
+#include <string>
+
+#include "date/date.h"
+#include "engine/engine.h"
+#include "oci.h"
+
+namespace engine::sqlite {
+
+class Coercion {
+public:
+    explicit Coercion(Column column) : column_(std::move(column)) {}
+
+    // Whether values of the column need a look at all.
+    static bool Concerns(const Column& column);
+
+    // The Datum may point into this object afterwards, until the next call.
+    Status Apply(Datum& value);
+
+private:
+    Status ApplyNumber(Datum& value);
+    Status ApplyDigits(Datum& value);
+    Status ApplyDecimal(const OCINumber& number, Datum& value);
+    Status ApplyText(Datum& value);
+    Status ApplyBytes(Datum& value);
+    Status ApplyDate(Datum& value);
+    Status ApplySize(const Datum& value);
+    [[nodiscard]] Status Refuse(int number) const;
+
+    Column column_;
+    OCINumber number_{};
+    std::array<char, date::kMaxEngineText> date_{};
+    std::string text_;
+};
+
+}  // namespace engine::sqlite
