@@ -142,7 +142,6 @@ xa_switch_t* XaSwitch() {
 
 void ForgetClientLibrary() {
     const LoaderComplaint complain = loader.complain;
-    if (loader.handle) dlclose(loader.handle);
     loader = {};
     loader.complain = complain;
     client_library = {};

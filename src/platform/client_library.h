@@ -39,7 +39,7 @@ void LoadClientLibrary();
 // The library's XA switch; null after a complaint when it has none. Loads the library.
 xa_switch_t* XaSwitch();
 
-// Forgets the library and the failures, so that the next call loads anew. For tests.
+// Forgets the library and the failures, so that the next call loads anew; what was loaded stays loaded. For tests.
 void ForgetClientLibrary();
 
 // Complains that the loaded library has no such function. Says nothing where the library itself is missing, or where

@@ -72,7 +72,7 @@ std::string ConvertShort(Converter& converter, const void* text, std::size_t len
 class PagePair {
 public:
     PagePair(const CodePage& source, const CodePage& target)
-        : source_(source), target_(target), converter_(target.name, source.name), decoder_("UCS-4LE", source.name) {
+        : source_(source), target_(target), converter_(target.name, source.name), decoder_("UTF-16LE", source.name) {
         Converter from_unicode(target.name, "UTF-8");
         substitute_ = ConvertShort(from_unicode, "\xEF\xBF\xBD", 3);
         if (substitute_.empty()) substitute_ = ConvertShort(from_unicode, "?", 1);
@@ -85,8 +85,9 @@ public:
 
     void Convert(Conversion& conversion) {
         Conversion attempt = conversion;
-        while (!Attempt(attempt)) {
-            // A letter held back did not fit: the same again without it.
+        unsigned char* fits = conversion.output_end;
+        while (!Attempt(attempt, fits)) {
+            // A letter held back did not fit, alone or joined with its accent: the same again without it.
             const unsigned char* const end = attempt.input - 1;
             attempt = conversion;
             attempt.input_end = end;
@@ -97,18 +98,22 @@ public:
     }
 
 private:
-    // False when something read could not be written in the end.
-    bool Attempt(Conversion& conversion) {
+    // False when a letter that was read does not fit; `fits` is then set before it. Nothing may be written beyond `fits`.
+    bool Attempt(Conversion& conversion, unsigned char*& fits) {
         converter_.Reset();
-        while (const int error = converter_.Run(conversion)) {
-            if (error == E2BIG) {
-                conversion.truncated = true;
-                break;
+        for (;;) {
+            const int error = converter_.Run(conversion);
+            unsigned char* const before = conversion.output;
+            const bool finished = converter_.Finish(conversion) && conversion.output <= fits;
+            // Where the area is full, a letter that was held back and fits alone has an accent to be joined with.
+            if (!finished || (error == E2BIG && conversion.output > before)) {
+                fits = std::min(fits, before);
+                return false;
             }
-            if (!converter_.Finish(conversion)) return false;
-            if (!Substitute(conversion)) break;
+            if (error == 0) return true;
+            if (error == E2BIG) conversion.truncated = true;
+            if (error == E2BIG || !Substitute(conversion)) return true;
         }
-        return converter_.Finish(conversion);
     }
 
     bool Substitute(Conversion& conversion) {

@@ -1,6 +1,7 @@
 // Which character set a code-page number stands for. All are stateless, so that a text may end after any character.
-// 1381 and 1383 agree in what both have in common with GB 2312, and that is converted; 5348 is 1252 with the euro sign,
-// which 1252 has long had.
+// Some share a converter: 5348 is 1252 with the euro sign, which 1252 has long had; of 1381 and 1383 what both have in
+// common, GB 2312, is converted; 932 and 943 go by CP932, since the converters named after them turn what they do not
+// have into a delete character and do not say so.
 #include "platform/code_page_table.h"
 
 #include <algorithm>
@@ -19,7 +20,7 @@ constexpr CodePage kCodePages[] = {
     {866, "IBM866"},         {869, "IBM869"},         {870, "IBM870"},         {871, "IBM871"},
     {874, "IBM874"},         {878, "KOI8-R"},         {912, "ISO-8859-2"},     {913, "ISO-8859-3"},
     {914, "ISO-8859-4"},     {915, "ISO-8859-5"},     {916, "ISO-8859-8"},     {920, "ISO-8859-9"},
-    {921, "ISO-8859-13"},    {923, "ISO-8859-15"},    {932, "IBM932"},         {943, "IBM943"},
+    {921, "ISO-8859-13"},    {923, "ISO-8859-15"},    {932, "CP932"},          {943, "CP932"},
     {949, "UHC"},            {950, "BIG5"},           {954, "EUC-JP"},         {964, "EUC-TW"},
     {970, "EUC-KR"},         {1026, "IBM1026"},       {1047, "IBM1047"},       {1089, "ISO-8859-6"},
     {1140, "IBM1140"},       {1141, "IBM1141"},       {1148, "IBM1148"},       {1200, "UTF-16BE", 2},

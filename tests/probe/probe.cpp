@@ -1,15 +1,16 @@
-// The probe library: exports the whole call interface, records each call with its arguments, and answers as a test tells
-// it. A test of the driver reads in the log what the library was really called with.
+// The probe library: exports the whole call interface, records each call with its arguments, and answers as a test
+// tells it. A test of the driver reads in the log what the library was really called with.
 //
-// A call is recorded as one line, "    probe: OCIPing(h3, h2, 0) = 0", on standard output, in order with the driver's own
-// text, or at the end of the file that PROBE_LOG names. A pointer reads as "null", as the name of what the probe handed
-// out ("h1", "h2", ... in the order of making), as a quoted text where a text and its length follow each other, or as
-// "pointer".
+// A call is recorded as one line, "    probe: OCIPing(h3, h2, 0) = 0", on standard output, in order with the driver's
+// own text, or at the end of the file that PROBE_LOG names. A pointer reads as "null", as the name of what the probe
+// handed out ("h1", "h2", ... in the order of making), as a quoted text where a text and its length follow each other
+// or where the text is terminated, as the parts of an XID, or as "pointer".
 //
-// PROBE_ANSWERS names a file of answers, a line each: FUNCTION RESULT [POSITION=TYPE:VALUE]...; what stands at POSITION,
-// counted from 1, is an output to fill: TYPE is i1, i2, i4, i8 for integers by width, t for a terminated text, p for a
-// pointer to one, f8 for a double. Answers for a function are used in order, the last one again and again; without any the result is 0. A result
-// of 0 hands out a new object through the first pointer to a pointer.
+// PROBE_ANSWERS names a file of answers, a line each: FUNCTION RESULT [POSITION[+OFFSET]=TYPE:VALUE]...; what stands
+// at POSITION, counted from 1, is an output to fill, OFFSET bytes behind its beginning: TYPE is i1, i2, i4, i8 for
+// integers by width, t for a terminated text, p for a pointer to one, f8 for a double. Answers for a function are used
+// in order, the last one again and again; without any the result is 0. A result of 0 hands out a new object through
+// the first pointer to a pointer; of a function that returns a pointer, 0 is null and anything else a new object.
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
@@ -20,7 +21,9 @@
 #include <mutex>
 #include <sstream>
 #include <string>
+#include <string_view>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 #include "oci.h"
@@ -30,6 +33,7 @@ namespace {
 
 struct Output {
     size_t position;
+    size_t offset;
     std::string type;
     std::string value;
 };
@@ -41,7 +45,7 @@ struct Answer {
 
 // One argument as the call passed it.
 struct Argument {
-    enum Form { integer, pointer, text, place } form;    // place: a pointer to a pointer
+    enum Form { integer, pointer, text, terminated, xid, place } form;    // place: a pointer to a pointer
     long long number;
     const void* address;
 };
@@ -64,7 +68,10 @@ Answer ReadAnswer(std::istringstream& words) {
             std::fprintf(stderr, "probe: cannot read answer %s\n", word.c_str());
             std::abort();
         }
-        answer.outputs.push_back({std::stoul(word), word.substr(equals + 1, colon - equals - 1), word.substr(colon + 1)});
+        const size_t plus = word.find('+');
+        const size_t offset = plus < equals ? std::stoul(word.substr(plus + 1)) : 0;
+        const std::string type = word.substr(equals + 1, colon - equals - 1);
+        answer.outputs.push_back({std::stoul(word), offset, type, word.substr(colon + 1)});
     }
     return answer;
 }
@@ -110,6 +117,14 @@ void AppendText(std::string& line, const void* text, long long length) {
     line += '"';
 }
 
+void AppendXid(std::string& line, const XID& xid) {
+    line += std::to_string(xid.formatID) + ":";
+    AppendText(line, xid.data, std::clamp(xid.gtrid_length, 0, XIDDATASIZE));
+    line += ":";
+    const sb4 start = std::clamp(xid.gtrid_length, 0, XIDDATASIZE);
+    AppendText(line, xid.data + start, std::clamp(xid.bqual_length, 0, XIDDATASIZE - start));
+}
+
 void AppendArgument(State& state, std::string& line, const Argument& argument, const Argument* next) {
     if (argument.form == Argument::integer) {
         line += std::to_string(argument.number);
@@ -119,6 +134,11 @@ void AppendArgument(State& state, std::string& line, const Argument& argument, c
         line += "h" + std::to_string(object->second);
     } else if (argument.form == Argument::text && next && next->form == Argument::integer) {
         AppendText(line, argument.address, next->number);
+    } else if (argument.form == Argument::terminated) {
+        const std::string_view whole = static_cast<const char*>(argument.address);
+        AppendText(line, whole.data(), static_cast<long long>(whole.size()));
+    } else if (argument.form == Argument::xid) {
+        AppendXid(line, *static_cast<const XID*>(argument.address));
     } else {
         line += "pointer";
     }
@@ -136,15 +156,19 @@ void Record(State& state, const char* function, const std::vector<Argument>& arg
     std::fflush(log);
 }
 
-void HandOut(State& state, const std::vector<Argument>& arguments) {
+void* MakeObject(State& state) {
     constexpr size_t kObjectSize = 256;
+    state.memory.emplace_back(kObjectSize);
+    void* object = state.memory.back().data();
+    state.objects.emplace(object, state.objects.size() + 1);
+    return object;
+}
+
+void HandOut(State& state, const std::vector<Argument>& arguments) {
     for (const Argument& argument : arguments) {
         if (argument.form != Argument::place) continue;
         if (!argument.address) return;
-        state.memory.emplace_back(kObjectSize);
-        void* object = state.memory.back().data();
-        state.objects.emplace(object, state.objects.size() + 1);
-        *static_cast<void**>(const_cast<void*>(argument.address)) = object;
+        *static_cast<void**>(const_cast<void*>(argument.address)) = MakeObject(state);
         return;
     }
 }
@@ -162,15 +186,16 @@ const char* KeepText(const std::string& text) {
 
 void Fill(const Output& output, const std::vector<Argument>& arguments) {
     if (output.position == 0 || output.position > arguments.size()) return;
-    const void* place = arguments[output.position - 1].address;
+    const auto* place = static_cast<const char*>(arguments[output.position - 1].address);
     if (!place) return;
+    place += output.offset;
     if (output.type == "i1") Store(place, static_cast<signed char>(std::stoll(output.value)));
     else if (output.type == "i2") Store(place, static_cast<short>(std::stoll(output.value)));
     else if (output.type == "i4") Store(place, static_cast<int>(std::stoll(output.value)));
     else if (output.type == "i8") Store(place, std::stoll(output.value));
     else if (output.type == "f8") Store(place, std::stod(output.value));
     else if (output.type == "p") Store(place, KeepText(output.value));
-    else std::memcpy(const_cast<void*>(place), output.value.c_str(), output.value.size() + 1);
+    else std::memcpy(const_cast<char*>(place), output.value.c_str(), output.value.size() + 1);
 }
 
 template <class T>
@@ -181,6 +206,8 @@ Argument Describe(T argument) {
         const void* address = reinterpret_cast<const void*>(argument);
         using Target = std::remove_pointer_t<T>;
         if constexpr (std::is_same_v<Target, const OraText>) return {Argument::text, 0, address};
+        else if constexpr (std::is_same_v<Target, XID>) return {Argument::xid, 0, address};
+        else if constexpr (std::is_same_v<Target, char>) return {Argument::terminated, 0, address};
         else if constexpr (std::is_pointer_v<Target> && !std::is_const_v<std::remove_pointer_t<Target>>)
             return {Argument::place, 0, address};
         else return {Argument::pointer, 0, address};
@@ -191,11 +218,14 @@ enum Index : size_t {
 #define FUNCTION(symbol) kIndexOf##symbol,
 #include "platform/client_functions.def"
 #undef FUNCTION
+    kIndexOfXa
 };
 const char* const kNames[] = {
 #define FUNCTION(symbol) #symbol,
 #include "platform/client_functions.def"
 #undef FUNCTION
+    "xa_open_entry", "xa_close_entry", "xa_start_entry", "xa_end_entry", "xa_rollback_entry", "xa_prepare_entry",
+    "xa_commit_entry", "xa_recover_entry", "xa_forget_entry", "xa_complete_entry",
 };
 
 // What every exported name leads to: the same function, once for each signature and name.
@@ -207,14 +237,23 @@ struct Entry<Result(Parameters...), kIndex> {
         State& state = TheState();
         const std::lock_guard lock(state.mutex);
         const Answer answer = NextAnswer(state, kNames[kIndex]);
-        const std::vector<Argument> arguments{Describe(parameters)...};
+        std::vector<Argument> arguments{Describe(parameters)...};
+        // An array of XIDs is there to be filled.
+        if (sizeof...(Parameters) > 3 && arguments[0].form == Argument::xid) arguments[0].form = Argument::pointer;
         Record(state, kNames[kIndex], arguments, answer.result);
         if (answer.result == 0) HandOut(state, arguments);
         for (const Output& output : answer.outputs) Fill(output, arguments);
-        if constexpr (std::is_pointer_v<Result>) return nullptr;
+        if constexpr (std::is_pointer_v<Result>)
+            return answer.result ? static_cast<Result>(MakeObject(state)) : nullptr;
         else if constexpr (!std::is_void_v<Result>) return static_cast<Result>(answer.result);
     }
 };
+
+// The entry of the XA switch that `member` points at, the `kIndex`th one.
+template <auto member, size_t kIndex>
+constexpr auto kSwitched =
+    &Entry<std::remove_pointer_t<std::remove_reference_t<decltype(std::declval<xa_switch_t>().*member)>>,
+           kIndexOfXa + kIndex>::Called;
 
 }  // namespace
 
@@ -227,3 +266,12 @@ struct Entry<Result(Parameters...), kIndex> {
     extern "C" __attribute__((ifunc("Resolve" #symbol), visibility("default"))) decltype(::symbol) symbol;
 #include "platform/client_functions.def"
 #undef FUNCTION
+
+xa_switch_t rmXaSwitch = {
+    "probe", TMNOFLAGS, 0,
+    kSwitched<&xa_switch_t::xa_open_entry, 0>,     kSwitched<&xa_switch_t::xa_close_entry, 1>,
+    kSwitched<&xa_switch_t::xa_start_entry, 2>,    kSwitched<&xa_switch_t::xa_end_entry, 3>,
+    kSwitched<&xa_switch_t::xa_rollback_entry, 4>, kSwitched<&xa_switch_t::xa_prepare_entry, 5>,
+    kSwitched<&xa_switch_t::xa_commit_entry, 6>,   kSwitched<&xa_switch_t::xa_recover_entry, 7>,
+    kSwitched<&xa_switch_t::xa_forget_entry, 8>,   kSwitched<&xa_switch_t::xa_complete_entry, 9>,
+};

@@ -1,0 +1,159 @@
+// Code pages: known bytes of each page both ways, areas of every length, what cannot be converted, the process's pages.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <random>
+#include <string>
+
+#include "platform/code_page.h"
+
+namespace {
+
+using namespace std::string_literals;
+
+struct Converted {
+    int result;
+    std::string output;
+    std::size_t unused_input;
+};
+
+// Converts into an area of just this capacity: the sanitizers see a byte too far.
+Converted Convert(unsigned source, unsigned target, const std::string& input, std::size_t capacity = 256) {
+    Converted converted;
+    std::size_t unused = 0;
+    char* const area = new char[capacity];
+    converted.result = CodePageConvert(source, target, input.data(), input.size(), &converted.unused_input, area,
+                                       capacity, &unused);
+    converted.output.assign(area, capacity - unused);
+    delete[] area;
+    return converted;
+}
+
+TEST(CodePages, KnownBytesBothWays) {
+    const struct { unsigned page; std::string bytes; std::string utf8; } cases[] = {
+        {37, "\xC1\xF1\x51\xBA", "A1é["},   {437, "\x82\xE1", "éß"},          {500, "\xC1\xF1\x51\x4A", "A1é["},
+        {819, "\xE9\xFF", "éÿ"},            {850, "\x82\xD5", "éı"},          {858, "\x82\xD5", "é€"},
+        {912, "\xB3", "ł"},                 {923, "\xA4\xBD", "€œ"},          {932, "\x82\xA0", "あ"},
+        {943, "\x82\xA0\xB1", "あｱ"},       {950, "\xA4\xA4", "中"},          {1200, "\x00\xE9\x4E\x2D"s, "é中"},
+        {1202, "\xE9\x00\x2D\x4E"s, "é中"}, {1208, "é中", "é中"},             {1250, "\xB3", "ł"},
+        {1251, "\xC6", "Ж"},                {1252, "\x80\xE9", "€é"},         {1253, "\xE1", "α"},
+        {1254, "\xF0", "ğ"},                {1255, "\xE0", "א"},              {1256, "\xC7", "ا"},
+        {1257, "\xE0", "ą"},                {1258, "e\xD2" "e", "ẻe"},    {1381, "\xD6\xD0", "中"},
+        {1383, "\xD6\xD0", "中"},           {5348, "\x80", "€"},              {13488, "\x00\xE9\x4E\x2D"s, "é中"},
+        {54936, "\xD6\xD0\x94\x32\xBE\x34", "中𝄞"}, {1202, "\x34\xD8\x1E\xDD", "𝄞"}, {1200, "\xD8\x34\xDD\x1E", "𝄞"},
+    };
+    for (const auto& c : cases) {
+        const Converted there = Convert(c.page, 1208, c.bytes);
+        const Converted back = Convert(1208, c.page, c.utf8);
+        EXPECT_EQ(there.result, kCodePageDone) << c.page;
+        EXPECT_EQ(there.output, c.utf8) << c.page;
+        EXPECT_EQ(back.result, kCodePageDone) << c.page;
+        EXPECT_EQ(back.output, c.bytes) << c.page;
+    }
+}
+
+// However short the area: no half character, and what was read is just what was written.
+TEST(CodePages, AreasOfEveryLength) {
+    const struct { unsigned source; unsigned target; std::string input; } cases[] = {
+        {1208, 1202, "aé中𝄞b"},      {1202, 1208, Convert(1208, 1202, "aé中𝄞b").output},
+        {1208, 1208, "aé中𝄞b"},      {1208, 54936, "aé中𝄞b"},
+        {54936, 1200, Convert(1208, 54936, "aé中𝄞b").output},
+        {943, 1208, "a\x82\xA0\xB1z"}, {1202, 943, Convert(943, 1202, "a\x82\xA0\xB1z").output},
+        {1258, 1208, "xe\xEC" "e\xEC" "ae"},    // each e but the last is joined by its accent
+        {1258, 1202, "xe\xEC" "ae\xEC"},        {1208, 37, "abcé"},
+        {1208, 1202, "a\xFFz\xE4\xB8"},         {1202, 850, Convert(1208, 1202, "aй中z").output},
+    };
+    for (const auto& c : cases) {
+        const Converted whole = Convert(c.source, c.target, c.input);
+        ASSERT_EQ(whole.unused_input, 0u);
+        for (std::size_t capacity = 0; capacity <= whole.output.size(); ++capacity) {
+            SCOPED_TRACE(testing::Message() << c.source << " to " << c.target << ", capacity " << capacity);
+            const Converted cut = Convert(c.source, c.target, c.input, capacity);
+            const bool is_whole = capacity == whole.output.size();
+            EXPECT_EQ(cut.result, is_whole ? whole.result : kCodePageTruncated);
+            EXPECT_EQ(cut.output, whole.output.substr(0, cut.output.size()));
+            const std::string read = c.input.substr(0, c.input.size() - cut.unused_input);
+            EXPECT_EQ(Convert(c.source, c.target, read).output, cut.output);
+            EXPECT_EQ(cut.unused_input > 0, !is_whole);
+        }
+    }
+}
+
+TEST(CodePages, WhatCannotBeConverted) {
+    const struct { unsigned source; unsigned target; std::string input; std::string output; } cases[] = {
+        {1208, 819, "a中b", "a?b"},                  {1208, 37, "中", "\x6F"},
+        {1208, 943, "é", "?"},                       {1202, 850, "\x34\xD8\x1E\xDD" "a\0"s, "?a"},
+        {1208, 1202, "a\xFF", "a\0\xFD\xFF"s},       {1208, 1202, "\xC0\x80", "\xFD\xFF\xFD\xFF"},
+        {1208, 1202, "\xED\xA0\x80", "\xFD\xFF\xFD\xFF\xFD\xFF"},
+        {1208, 1202, "\xF4\x90\x80\x80", "\xFD\xFF\xFD\xFF\xFD\xFF\xFD\xFF"},
+        {1208, 1202, "é\xE4\xB8", "\xE9\0\xFD\xFF\xFD\xFF"s},
+        {1202, 1208, "\x34\xD8" "a\0"s, "\uFFFD" "a"}, {1202, 1208, "\x1E\xDD", "\uFFFD"},
+        {1202, 1208, "a\0b"s, "a\uFFFD"},            {1202, 819, "a\0b"s, "a?"},
+        {1200, 1208, "\xD8\x34", "\uFFFD"},          {1208, 13488, "𝄞", "\xFF\xFD"},
+        {943, 1208, "a\x82", "a\uFFFD"},
+    };
+    for (const auto& c : cases) {
+        const Converted converted = Convert(c.source, c.target, c.input);
+        EXPECT_EQ(converted.result, kCodePageSubstituted) << c.source << " to " << c.target;
+        EXPECT_EQ(converted.output, c.output) << c.source << " to " << c.target << testing::PrintToString(c.input);
+        EXPECT_EQ(converted.unused_input, 0u);
+    }
+}
+
+// The two ways to convert Unicode, by hand and through iconv, agree on any bytes.
+TEST(CodePages, TheShortWayAgreesWithTheLongOne) {
+    std::mt19937 random(7);
+    const char bytes[] = "ab\0\x7F\x80\xBF\xC2\xC3\xA9\xD8\xDC\xE0\xE4\xB8\xAD\xED\xA0\xEF\xF0\x9D\x84\x9E\xF4\x90\xFF";
+    for (int round = 0; round < 3000; ++round) {
+        std::string input(random() % 12, '\0');
+        for (char& byte : input) byte = bytes[random() % (sizeof bytes - 1)];
+        const Converted short_way = Convert(1208, 1202, input);
+        const Converted long_way = Convert(1208, 1200, input);
+        EXPECT_EQ(short_way.output, Convert(1200, 1202, long_way.output).output) << testing::PrintToString(input);
+        EXPECT_EQ(short_way.result, long_way.result) << testing::PrintToString(input);
+
+        std::string swapped = input.substr(0, input.size() / 2 * 2);
+        for (std::size_t index = 0; index < swapped.size(); index += 2) std::swap(swapped[index], swapped[index + 1]);
+        const std::string even = input.substr(0, swapped.size());
+        EXPECT_EQ(Convert(1202, 1208, even).output, Convert(1200, 1208, swapped).output)
+            << testing::PrintToString(even);
+    }
+}
+
+TEST(CodePages, Refused) {
+    char area[4];
+    std::size_t unused_input = 0;
+    std::size_t unused_output = 0;
+    EXPECT_EQ(CodePageConvert(1208, 4711, "ab", 2, &unused_input, area, 4, &unused_output), kCodePageUnknown);
+    EXPECT_EQ(unused_input, 2u);
+    EXPECT_EQ(unused_output, 4u);
+    EXPECT_EQ(CodePageConvert(0, 1202, "ab", 2, nullptr, area, 4, nullptr), kCodePageUnknown);
+    EXPECT_EQ(CodePageConvert(1208, 1202, nullptr, 2, nullptr, area, 4, nullptr), kCodePageBadArgument);
+    EXPECT_EQ(CodePageConvert(1208, 1202, "ab", 2, nullptr, nullptr, 4, nullptr), kCodePageBadArgument);
+    EXPECT_EQ(CodePageConvert(1208, 850, nullptr, 0, nullptr, nullptr, 0, nullptr), kCodePageDone);
+}
+
+TEST(CodePages, OfTheProcess) {
+    const struct { const char* locale; const char* setting; int result; unsigned first; unsigned second; } cases[] = {
+        {"C", nullptr, 0, 1208, 1208},         {"C.UTF-8", nullptr, 0, 1208, 1208},
+        {"not-a-locale", "", 0, 1208, 1208},   {"C", "850", 0, 850, 850},
+        {"C", "1208,1252", 0, 1208, 1252},     {"C", "13488,1208", 0, 13488, 1208},
+        {"C", "0", kCodePageUnknown, 1208, 1208},         {"C", "1208,1", kCodePageUnknown, 1208, 1208},
+        {"C", "1208,", kCodePageBadArgument, 1208, 1208}, {"C", "latin", kCodePageBadArgument, 1208, 1208},
+        {"C", "850 ", kCodePageBadArgument, 1208, 1208},  {"C", "99999999999", kCodePageBadArgument, 1208, 1208},
+    };
+    for (const auto& c : cases) {
+        setenv("LC_ALL", c.locale, 1);
+        if (c.setting) setenv("KELPCI_CODEPAGE", c.setting, 1);
+        std::uint32_t first = 0;
+        std::uint32_t second = 0;
+        const char* const shown = c.setting ? c.setting : c.locale;
+        EXPECT_EQ(GetProcessCodePage(&first, &second), c.result) << shown;
+        EXPECT_EQ(first, c.first) << shown;
+        EXPECT_EQ(second, c.second) << shown;
+        unsetenv("KELPCI_CODEPAGE");
+    }
+    unsetenv("LC_ALL");
+}
+
+}  // namespace

@@ -1,0 +1,129 @@
+// Packed decimal, numbers from text, tagged memory.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <limits>
+#include <string>
+#include <vector>
+
+#include "platform/memory.h"
+#include "platform/numbers.h"
+#include "platform/packed_decimal.h"
+
+namespace {
+
+using namespace std::string_literals;
+
+TEST(PackedDecimal, ToText) {
+    const struct { std::string packed; unsigned precision; int scale; const char* text; int result; } cases[] = {
+        {"\x12\x34\x5D", 5, 2, "-123.45", 0},  {"\x12\x34\x5C", 5, 0, "12345", 0},   {"\x00\x00\x0D"s, 5, 2, "0.00", 0},
+        {"\x00\x00\x5B"s, 5, 2, "-0.05", 0},   {"\x01\x2F", 2, 2, "0.12", 0},        {"\x01\x2A", 2, 4, "0.0012", 0},
+        {"\x12\x3E", 3, 3, "0.123", 0},        {"\x12\x3C", 3, -2, "12300", 0},      {"\x00\x0C"s, 3, -2, "0", 0},
+        {"\x7C", 1, 0, "7", 0},                {"\xC", 0, 0, "0", 0},
+        {"\x12\x34\x59", 5, 2, "", kDecimalBadSign},        {"\x1A\x34\x5C", 5, 2, "1", kDecimalBadDigit},
+        {"\x12\x34\xBC", 5, 2, "123.4", kDecimalBadDigit},
+    };
+    for (const auto& c : cases) {
+        char text[64] = "?";
+        const auto* packed = reinterpret_cast<const unsigned char*>(c.packed.data());
+        EXPECT_EQ(DecimalToText(packed, c.precision, c.scale, text, sizeof text), c.result) << c.text;
+        EXPECT_STREQ(text, c.text);
+    }
+}
+
+TEST(PackedDecimal, ToTextOfEveryCapacity) {
+    const std::string whole = "-123.45";
+    for (std::size_t capacity = 0; capacity < 10; ++capacity) {
+        std::vector<char> area(capacity);
+        const unsigned char packed[] = {0x12, 0x34, 0x5D};
+        const int result = DecimalToText(packed, 5, 2, area.data(), capacity);
+        EXPECT_EQ(result, capacity > whole.size() ? kDecimalDone : kDecimalTooShort) << capacity;
+        const std::string text = capacity == 0 ? "" : area.data();
+        EXPECT_EQ(text, whole.substr(0, capacity == 0 ? 0 : capacity - 1));
+    }
+}
+
+TEST(PackedDecimal, FromText) {
+    const struct { const char* text; unsigned precision; int scale; std::string packed; } cases[] = {
+        {"-123.45", 5, 2, "\x12\x34\x5D"}, {" +1.5 ", 5, 2, "\x00\x15\x0C"s},  {"0.0", 5, 2, "\x00\x00\x0C"s},
+        {"-0", 5, 2, "\x00\x00\x0C"s},     {"1.005", 3, 2, "\x10\x1C"},        {"-1.0049", 3, 2, "\x10\x0D"},
+        {"9.995", 4, 2, "\x01\x00\x0C"s},  {".5", 1, 0, "\x1C"},               {"0.04", 1, 1, "\x0C"},
+        {"-0.04", 1, 1, "\x0C"},           {"0.004", 1, 1, "\x0C"},            {"12e2", 4, 0, "\x01\x20\x0C"s},
+        {"1234e-2", 4, 2, "\x01\x23\x4C"}, {"1e-999999999999", 3, 2, "\x00\x0C"s}, {"12345", 3, -2, "\x12\x3C"},
+        {"000000123", 3, 0, "\x12\x3C"},   {"0e999999", 3, 0, "\x00\x0C"s},
+    };
+    for (const auto& c : cases) {
+        std::string packed(PackedDecimalSize(c.precision), '?');
+        auto* area = reinterpret_cast<unsigned char*>(packed.data());
+        EXPECT_EQ(TextToDecimal(c.text, area, c.precision, c.scale), kDecimalDone) << c.text;
+        EXPECT_EQ(packed, c.packed) << c.text;
+    }
+    const struct { const char* text; unsigned precision; int scale; int result; } refused[] = {
+        {"1000", 5, 2, kDecimalOverflow}, {"999.995", 5, 2, kDecimalOverflow}, {"1e9999999999", 5, 2, kDecimalOverflow},
+        {"", 5, 2, kDecimalBadText},      {".", 5, 2, kDecimalBadText},        {"1.2.3", 5, 2, kDecimalBadText},
+        {"12x", 5, 2, kDecimalBadText},   {"1e", 5, 2, kDecimalBadText},       {"--1", 5, 2, kDecimalBadText},
+        {nullptr, 5, 2, kDecimalBadText},
+    };
+    for (const auto& c : refused) {
+        unsigned char packed[3] = {1, 2, 3};
+        EXPECT_EQ(TextToDecimal(c.text, packed, c.precision, c.scale), c.result) << (c.text ? c.text : "null");
+        EXPECT_EQ(packed[0], 1);
+    }
+}
+
+TEST(Numbers, RulesOfAtoiAndBeyondTheRange) {
+    const struct { const char* text; std::int32_t i; std::int64_t l; std::uint64_t u; } cases[] = {
+        {"42", 42, 42, 42},
+        {" \t-7x", -7, -7, 0xFFFFFFFFFFFFFFF9},
+        {"+3", 3, 3, 3},
+        {"x", 0, 0, 0},
+        {"", 0, 0, 0},
+        {nullptr, 0, 0, 0},
+        {"0x10", 0, 0, 0},
+        {"010", 10, 10, 10},
+        {"2147483648", 2147483647, 2147483648, 2147483648},
+        {"-2147483649", -2147483647 - 1, -2147483649, 0xFFFFFFFF7FFFFFFF},
+        {"18446744073709551615", 2147483647, INT64_MAX, UINT64_MAX},
+        {"99999999999999999999", 2147483647, INT64_MAX, UINT64_MAX},
+        {"-99999999999999999999", -2147483647 - 1, INT64_MIN, UINT64_MAX},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(AtoiRules(c.text), c.i) << (c.text ? c.text : "null");
+        EXPECT_EQ(AtolRules(c.text), c.l) << (c.text ? c.text : "null");
+        EXPECT_EQ(StrToInt64(c.text), c.l) << (c.text ? c.text : "null");
+        EXPECT_EQ(StrToUint64(c.text), c.u) << (c.text ? c.text : "null");
+    }
+}
+
+TEST(Memory, BlocksAreCountedByTagAndFilledWithZeros) {
+    auto* block = static_cast<char*>(PlatformAlloc(100, "one", 11));
+    void* other = PlatformAlloc(0, "two", 12);
+    EXPECT_EQ(std::string(block, 100), std::string(100, '\0'));
+    EXPECT_NE(other, nullptr);
+    EXPECT_EQ(PlatformOutstanding("one"), 1u);
+    EXPECT_EQ(PlatformOutstanding("two"), 1u);
+    PlatformVisit("one", [](const PlatformBlock& seen, void* expected) {
+        EXPECT_EQ(seen.pointer, expected);
+        EXPECT_EQ(seen.size, 100u);
+        EXPECT_EQ(seen.line, 11);
+    }, block);
+    EXPECT_TRUE(PlatformFree(block, std::string("one").c_str()));
+    EXPECT_TRUE(PlatformFree(other, "two"));
+    EXPECT_EQ(PlatformOutstanding("one") + PlatformOutstanding("two"), 0u);
+}
+
+TEST(Memory, RefusesWhatItDidNotGiveOut) {
+    char local = 0;
+    char* block = static_cast<char*>(PlatformAlloc(8, "tag", 1));
+    EXPECT_FALSE(PlatformFree(nullptr, "tag"));
+    EXPECT_FALSE(PlatformFree(&local, "tag"));
+    EXPECT_FALSE(PlatformFree(block + 1, "tag"));
+    EXPECT_FALSE(PlatformFree(reinterpret_cast<void*>(16), "tag"));
+    EXPECT_FALSE(PlatformFree(block, "gat"));
+    EXPECT_TRUE(PlatformFree(block, "tag"));
+    EXPECT_FALSE(PlatformFree(block, "tag"));
+    EXPECT_EQ(PlatformAlloc(std::numeric_limits<std::size_t>::max(), "tag", 1), nullptr);
+    EXPECT_EQ(PlatformOutstanding("tag"), 0u);
+}
+
+}  // namespace
