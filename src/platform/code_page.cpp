@@ -98,7 +98,7 @@ public:
     }
 
 private:
-    // False when a letter that was read does not fit; `fits` is then set before it. Nothing may be written beyond `fits`.
+    // False when a letter that was read does not fit; `fits` is then set before it. Nothing is written beyond `fits`.
     bool Attempt(Conversion& conversion, unsigned char*& fits) {
         converter_.Reset();
         for (;;) {

@@ -1,4 +1,4 @@
-// Packed decimal, numbers from text, tagged memory.
+// Packed decimal, numbers from text, tagged memory, message texts.
 #include <gtest/gtest.h>
 
 #include <cstring>
@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "platform/memory.h"
+#include "platform/message_texts.h"
 #include "platform/numbers.h"
 #include "platform/packed_decimal.h"
 
@@ -124,6 +125,41 @@ TEST(Memory, RefusesWhatItDidNotGiveOut) {
     EXPECT_FALSE(PlatformFree(block, "tag"));
     EXPECT_EQ(PlatformAlloc(std::numeric_limits<std::size_t>::max(), "tag", 1), nullptr);
     EXPECT_EQ(PlatformOutstanding("tag"), 0u);
+}
+
+TEST(MessageTexts, OfDiagnosticsInLines) {
+    SQLCA diagnostics{};
+    diagnostics.sqlcode = -1017;
+    const auto text = [&](std::size_t width, std::size_t capacity = 100) {
+        std::vector<char> area(capacity);
+        return std::string(area.data(), SqlcaMessageText(area.data(), capacity, width, diagnostics));
+    };
+    const std::string words = "invalid user name or password ";
+    EXPECT_EQ(text(80), "ORA-01017");
+    words.copy(diagnostics.sqlerrmc, words.size());
+    diagnostics.sqlerrml = static_cast<sb2>(words.size());
+    EXPECT_EQ(text(80), "invalid user name or password");
+    EXPECT_EQ(text(12), "invalid user\nname or\npassword");
+    EXPECT_EQ(text(4), "inva\nlid\nuser\nname\nor\npass\nword");
+    EXPECT_EQ(text(12, 10), "invalid u");
+    EXPECT_EQ(text(0, 4), "i\nn");
+    EXPECT_EQ(text(80, 0), "");
+    diagnostics.sqlerrml = 32767;
+    EXPECT_EQ(text(80), "invalid user name or password");
+    diagnostics = {};
+    EXPECT_EQ(text(80), "");
+}
+
+TEST(MessageTexts, OfSqlstates) {
+    const struct { const char* code; const char* text; } cases[] = {
+        {"40001", "40001: transaction rollback: serialization failure"}, {"40003", "40003: transaction rollback"},
+        {"28000xyz", "28000: invalid authorization specification"}, {"00000", ""}, {"28", ""}, {"ZZ000", ""}, {"", ""},
+    };
+    for (const auto& c : cases) {
+        char area[100];
+        const std::size_t length = SqlstateMessageText(area, sizeof area, 80, c.code);
+        EXPECT_EQ(std::string(area, length), c.text) << c.code;
+    }
 }
 
 }  // namespace
