@@ -65,8 +65,8 @@ Status SqliteConnection::Prime() {
     private_ = *sqlite3_db_filename(database_.get(), "main") == '\0';
     Status status = AddFunctions(database_.get());
     if (status.Ok()) status = Run("select count(*) from sqlite_schema");    // not a database; cannot be read
-    // A file that cannot be written keeps the journal it has.
-    if (status.Ok() && !private_ && !sqlite3_db_readonly(database_.get(), "main")) status = Run("pragma journal_mode=wal");
+    // A file that cannot be written, or that somebody is using in another way, keeps the journal it has.
+    if (status.Ok() && !private_) (void)Run("pragma journal_mode=wal");
     if (status.Ok()) status = Run("pragma foreign_keys=on");
     if (status.Ok()) utf8_ = Text("pragma encoding") == "UTF-8";
     return status;
