@@ -11,6 +11,7 @@ public:
     explicit Parameter(const Origin& origin) : Object(origin) {}
     ~Parameter() override;
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
 
     engine::Column column;
     std::uint32_t position = 0;        // from 1

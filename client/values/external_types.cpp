@@ -71,7 +71,9 @@ int StoreTruncated(const Elements& elements, std::size_t index, const Target& ta
 ColumnClass ClassOf(std::uint16_t internal_type) {
     switch (internal_type) {
         case SQLT_NUM:
-        case SQLT_VNU: return ColumnClass::number;
+        case SQLT_VNU:
+        case SQLT_BFLOAT:
+        case SQLT_BDOUBLE: return ColumnClass::number;
         case SQLT_DAT:
         case SQLT_DATE: return ColumnClass::date;
         case SQLT_TIMESTAMP:

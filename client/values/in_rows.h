@@ -27,6 +27,9 @@ int FromDatetime(const Source&, Workspace&, engine::Datum&);    // OCIDateTime*
 int FromRdd(const Source&, Workspace&, engine::Datum&);         // OCIRowid*
 int FromNothing(const Source&, Workspace&, engine::Datum&);     // no conversion: 932
 
+// A text that is compared with row ids becomes one.
+int RowIdFromText(engine::Datum&);
+
 // A whole value that came in pieces; data must live until the Datum is used.
 int FromWholeText(std::string_view data, Workspace&, engine::Datum&);
 int FromWholeBytes(std::string_view data, Workspace&, engine::Datum&);

@@ -1,6 +1,7 @@
 // The rows of the conversion matrix from the engine to the application: by external type, a converter for each origin.
 #pragma once
 
+#include "date/date.h"
 #include "values/conversion.h"
 
 namespace values {
@@ -14,6 +15,11 @@ extern const ByOrigin<OutConverter> kToRid, kToRdd;                             
 extern const ByOrigin<OutConverter> kToNothing;                                                   // no conversion: 932
 
 extern const ByOrigin<Renderer> kWholeText, kWholeBytes;
+
+// Into the objects that elements point to.
+int PutString(std::string_view utf8, Workspace&, Target&);
+int PutRaw(std::string_view bytes, Workspace&, Target&);
+int PutDatetime(const date::DateTime& value, Workspace&, Target&);
 
 int NoConversion(const engine::Datum&, Workspace&, Target&);
 

@@ -38,5 +38,6 @@ constexpr ByOrigin<OutConverter> kDateRow = {
 
 const ByOrigin<OutConverter> kToDat = kDateRow<PutDat>;
 const ByOrigin<OutConverter> kToOdt = kDateRow<PutOdt>;
+const ByOrigin<OutConverter> kToDatetime = kDateRow<PutDatetime>;
 
 }  // namespace values

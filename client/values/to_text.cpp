@@ -10,7 +10,6 @@
 #include "handles/environment.h"
 #include "number/number.h"
 #include "oci.h"
-#include "text/string_object.h"
 #include "values/out_rows.h"
 #include "values/rowid.h"
 
@@ -284,8 +283,10 @@ const ByOrigin<OutConverter> kToStr = kTextRow<PutStr>;
 const ByOrigin<OutConverter> kToAfc = kTextRow<PutAfc>;
 const ByOrigin<OutConverter> kToPrefix2 = kTextRow<PutPrefixed<std::uint16_t>>;
 const ByOrigin<OutConverter> kToPrefix4 = kTextRow<PutPrefixed<std::uint32_t>>;
+const ByOrigin<OutConverter> kToString = kTextRow<PutString>;
 const ByOrigin<OutConverter> kToBin = kBytesRow<PutBin>;
 const ByOrigin<OutConverter> kToVbi = kBytesRow<PutVbi>;
+const ByOrigin<OutConverter> kToRaw = kBytesRow<PutRaw>;
 
 const ByOrigin<Renderer> kWholeText = {NoText, IntegerText, RealText, DecimalText, OwnText, HexText,
                                        DateText, NoText, RowIdText, NoText, NumericText};

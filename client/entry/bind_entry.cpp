@@ -1,0 +1,58 @@
+// Binds and defines.
+#include "entry/text_argument.h"
+#include "handles/gate.h"
+#include "statements/statement.h"
+
+namespace {
+
+constexpr int kNoSuchBind = 1036;
+constexpr int kBadText = 24501;
+
+Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4 length, const Statement::BindArguments& arguments) {
+    if (!name) return Error(kNoSuchBind);
+    // A length below 0 asks to measure the name.
+    const TextArgument text(statement.Env(), name, length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length),
+                            false);
+    return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(kBadText);
+}
+
+// Steps of an array of structures, for a bind or a define.
+template <class Area>
+sword SetSteps(const void* handle, OCIError* err, ub4 value, ub4 indicator, ub4 length, ub4 code) {
+    return Enter<Area>(handle, err, [&](Area& area) {
+        area.SetSteps(value, indicator, length, code);
+        return Status();
+    });
+}
+
+}  // namespace
+
+sword OCIBindByName(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 nameLen, dvoid* value, sb4 valueSize,
+                    ub2 type, dvoid* ind, ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return BindByName(statement, bind, name, nameLen,
+                          {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
+    });
+}
+
+sword OCIBindByPos(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type, dvoid* ind,
+                   ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return statement.BindByPosition(bind, pos, {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
+    });
+}
+
+sword OCIDefineByPos(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type, dvoid* ind,
+                     ub2* rlen, ub2* rcode, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return statement.DefineByPosition(def, pos, {value, valueSize, type, ind, rlen, rcode}, mode);
+    });
+}
+
+sword OCIBindArrayOfStruct(OCIBind* b, OCIError* err, ub4 valueSkip, ub4 indSkip, ub4 lenSkip, ub4 rcodeSkip) {
+    return SetSteps<Bind>(b, err, valueSkip, indSkip, lenSkip, rcodeSkip);
+}
+
+sword OCIDefineArrayOfStruct(OCIDefine* d, OCIError* err, ub4 valueSkip, ub4 indSkip, ub4 lenSkip, ub4 rcodeSkip) {
+    return SetSteps<Define>(d, err, valueSkip, indSkip, lenSkip, rcodeSkip);
+}

@@ -1,0 +1,139 @@
+// Statements: prepare, release, execute, fetch, result sets, bind information, pieces.
+#include "entry/text_argument.h"
+#include "handles/gate.h"
+#include "sessions/service_context.h"
+#include "statements/result_set.h"
+#include "statements/statement.h"
+#include "statements/statement_cache.h"
+
+namespace {
+
+constexpr int kBadMode = 24300;
+constexpr int kBadResultSet = 24336;
+constexpr int kNoText = 24373;
+constexpr int kIllegalOperation = 24370;
+constexpr int kFromPrepare2 = 24433;
+constexpr int kBadText = 24501;
+
+Status CheckSyntax(ub4 language) {
+    return language == OCI_NTV_SYNTAX || language == OCI_V7_SYNTAX || language == OCI_V8_SYNTAX ? Status() : Error(kBadMode);
+}
+
+Status Prepare(Statement& statement, const OraText* sql, ub4 length, ub4 language, ub4 mode) {
+    if (statement.from_prepare2) return Error(kFromPrepare2);
+    if (!sql || length == 0) return Error(kNoText);
+    if (Status status = CheckSyntax(language); !status.Ok()) return status;
+    if (mode & ~ub4{OCI_UTF16}) return Error(kBadMode);
+    const TextArgument text(statement.Env(), sql, length, mode & OCI_UTF16);
+    if (!text.Valid()) return Error(kBadText);
+    return text.View().empty() ? Error(kNoText) : statement.Prepare(text.View());
+}
+
+Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 length, const OraText* key, ub4 key_length,
+                ub4 language, ub4 mode) {
+    if (!out) return Error(kNullArgument);
+    if (Status status = CheckSyntax(language); !status.Ok()) return status;
+    if (mode & ~ub4{OCI_PREP2_CACHE_SEARCHONLY | OCI_UTF16}) return Error(kBadMode);
+    const TextArgument text(service.Env(), sql, length, mode & OCI_UTF16);
+    const TextArgument tag(service.Env(), key, key_length, mode & OCI_UTF16);
+    if (!text.Valid() || !tag.Valid()) return Error(kBadText);
+    Statement* statement = nullptr;
+    Status status = PrepareThroughCache(service, {text.View(), tag.View(), (mode & OCI_PREP2_CACHE_SEARCHONLY) != 0}, statement);
+    if (!status.Failed()) *out = AsHandle<OCIStmt>(statement);
+    return status;
+}
+
+Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length, ub4 mode) {
+    if (mode & ~ub4{OCI_STRLS_CACHE_DELETE}) return Error(kBadMode);
+    const TextArgument tag(statement.Env(), key, key_length, false);
+    if (!tag.Valid()) return Error(kBadText);
+    return Release(statement, tag.View(), !(mode & OCI_STRLS_CACHE_DELETE));
+}
+
+sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return mode == OCI_DEFAULT ? statement.Fetch(rows, orientation, offset) : Error(kBadMode);
+    });
+}
+
+template <class Area>
+sword SetPiece(dvoid* handle, OCIError* err, const PieceBuffer& piece) {
+    return Enter<Area>(handle, err, [&](Area& area) {
+        return area.statement ? area.statement->SetPieceInfo(area, piece) : Error(kIllegalOperation);
+    });
+}
+
+}  // namespace
+
+sword OCIStmtPrepare(OCIStmt* stmt, OCIError* err, const OraText* sql, ub4 sqlLen, ub4 language, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) { return Prepare(statement, sql, sqlLen, language, mode); });
+}
+
+sword OCIStmtPrepare2(OCISvcCtx* svc, OCIStmt** stmtOut, OCIError* err, const OraText* sql, ub4 sqlLen, const OraText* key,
+                      ub4 keyLen, ub4 language, ub4 mode) {
+    return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
+        return Prepare2(service, stmtOut, sql, sqlLen, key, keyLen, language, mode);
+    });
+}
+
+sword OCIStmtRelease(OCIStmt* stmt, OCIError* err, const OraText* key, ub4 keyLen, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) { return ReleaseStatement(statement, key, keyLen, mode); });
+}
+
+// Snapshots are not looked at: a query sees what is there when it is executed.
+sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub4 rowoff, const OCISnapshot*, OCISnapshot*,
+                     ub4 mode) {
+    return EnterWithError<ServiceContext>(svc, err, [&](ServiceContext& service, ErrorHandle& error) {
+        auto* statement = Live<Statement>(stmt);
+        return statement ? statement->Execute(service, error, {iters, rowoff, mode}) : InvalidHandle();
+    });
+}
+
+sword OCIStmtFetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, ub4 mode) {
+    return Fetch(stmt, err, rows, orientation, 0, mode);
+}
+
+sword OCIStmtFetch2(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
+    return Fetch(stmt, err, rows, orientation, offset, mode);
+}
+
+// A cursor that a block opened is a statement already.
+sword OCIResultSetToStmt(OCIResult* rset, OCIError* err) {
+    return EnterError(err, [&](ErrorHandle&) {
+        auto* result = Live<ResultSet>(rset);
+        const Statement* statement = result ? result : Live<Statement>(rset);
+        if (!statement) return InvalidHandle();
+        if (!statement->HasResult()) return Error(kBadResultSet);
+        if (result) result->BecomeStatement();
+        return Status();
+    });
+}
+
+sword OCIStmtGetBindInfo(OCIStmt* stmt, OCIError* err, ub4 size, ub4 startloc, sb4* found, OraText* names[], ub1 nameLens[],
+                         OraText* indNames[], ub1 indLens[], ub1 dups[], OCIBind* binds[]) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return statement.GetBindInfo({size, startloc, found, names, nameLens, indNames, indLens, dups, binds});
+    });
+}
+
+sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type, ub1* inOut, ub4* iter, ub4* idx, ub1* piece) {
+    return Enter<Statement>(stmt, err, [&](const Statement& statement) {
+        Statement::PieceInfo info;
+        Status status = statement.GetPieceInfo(info);
+        if (!status.Ok()) return status;
+        if (hndl) *hndl = info.handle;
+        if (type) *type = info.type;
+        if (inOut) *inOut = info.direction;
+        if (iter) *iter = info.iteration;
+        if (idx) *idx = info.index;
+        if (piece) *piece = info.piece;
+        return status;
+    });
+}
+
+sword OCIStmtSetPieceInfo(dvoid* hndl, ub4 type, OCIError* err, const dvoid* buf, ub4* len, ub1 piece, const dvoid* ind,
+                          ub2* rcode) {
+    const PieceBuffer buffer{const_cast<dvoid*>(buf), len, const_cast<dvoid*>(ind), rcode, piece, false};
+    return type == OCI_HTYPE_BIND ? SetPiece<Bind>(hndl, err, buffer)
+                                  : SetPiece<Define>(type == OCI_HTYPE_DEFINE ? hndl : nullptr, err, buffer);
+}

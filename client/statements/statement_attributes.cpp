@@ -1,0 +1,102 @@
+// Attributes of statements.
+#include "handles/attributes.h"
+#include "handles/environment.h"
+#include "statements/statement.h"
+#include "values/rowid_descriptor.h"
+
+// Reads what the class keeps to itself.
+struct StatementAttributes {
+    static Status Text(Statement& statement, AttributeValue& value) {
+        value.text = statement.text_;
+        return {};
+    }
+    static Status Type(Statement& statement, AttributeValue& value) {
+        const bool is_result = !statement.prepared_ && statement.HasResult();
+        value.integer = is_result ? OCI_STMT_SELECT : static_cast<std::uint16_t>(statement.scanned_.type);
+        return {};
+    }
+    static Status FunctionCode(Statement& statement, AttributeValue& value) {
+        value.integer = statement.scanned_.function_code;
+        return {};
+    }
+    static Status RowCount(Statement& statement, AttributeValue& value) {
+        value.integer = statement.row_count_;
+        return {};
+    }
+    static Status RowsFetched(Statement& statement, AttributeValue& value) {
+        value.integer = statement.rows_fetched_;
+        return {};
+    }
+    static Status FailedRows(Statement& statement, AttributeValue& value) {
+        value.integer = statement.failed_rows_;
+        return {};
+    }
+    static Status ColumnCount(Statement& statement, AttributeValue& value) {
+        const auto* columns = statement.Columns();
+        value.integer = columns ? columns->size() : 0;
+        return {};
+    }
+    static Status BindCount(Statement& statement, AttributeValue& value) {
+        value.integer = statement.scanned_.positions.size();
+        return {};
+    }
+    static Status State(Statement& statement, AttributeValue& value) {
+        value.integer = static_cast<std::uint8_t>(statement.state_);
+        return {};
+    }
+    static Status Position(Statement& statement, AttributeValue& value) {
+        value.integer = statement.cursor_.Position();
+        return {};
+    }
+    static Status IsReturning(Statement& statement, AttributeValue& value) {
+        value.integer = statement.scanned_.Returning();
+        return {};
+    }
+    // Bytes of the application's text before the error.
+    static Status ErrorOffset(Statement& statement, AttributeValue& value) {
+        value.integer = statement.parse_error_offset_;
+        if (!statement.Env().Utf16()) return {};
+        std::string units;
+        utf::ToUtf16(std::string_view(statement.text_).substr(0, statement.parse_error_offset_), units);
+        value.integer = units.size();
+        return {};
+    }
+    static Status RowId(Statement& statement, AttributeValue& value) {
+        constexpr int kNoRowId = 1410;
+        auto* descriptor = Live<RowIdDescriptor>(value.pointer);
+        if (!descriptor) return InvalidHandle();
+        if (statement.last_row_ == 0) return Error(kNoRowId);
+        descriptor->value = rowid::RowId{0, statement.last_row_};
+        return {};
+    }
+};
+
+namespace {
+
+using S = StatementAttributes;
+constexpr AttributeRow kRows[] = {
+    {OCI_ATTR_STATEMENT, Shape::text, Get<Statement, S::Text>, nullptr},
+    {OCI_ATTR_STMT_TYPE, Shape::ub2, Get<Statement, S::Type>, nullptr},
+    {OCI_ATTR_SQLFNCODE, Shape::ub2, Get<Statement, S::FunctionCode>, nullptr},
+    {OCI_ATTR_ROW_COUNT, Shape::ub4, Get<Statement, S::RowCount>, nullptr},
+    {OCI_ATTR_UB8_ROW_COUNT, Shape::ub8, Get<Statement, S::RowCount>, nullptr},
+    {OCI_ATTR_ROWS_FETCHED, Shape::ub4, Get<Statement, S::RowsFetched>, nullptr},
+    {OCI_ATTR_NUM_DML_ERRORS, Shape::ub4, Get<Statement, S::FailedRows>, nullptr},
+    {OCI_ATTR_PARAM_COUNT, Shape::ub4, Get<Statement, S::ColumnCount>, nullptr},
+    {OCI_ATTR_BIND_COUNT, Shape::ub4, Get<Statement, S::BindCount>, nullptr},
+    {OCI_ATTR_STMT_STATE, Shape::ub4, Get<Statement, S::State>, nullptr},
+    {OCI_ATTR_CURRENT_POSITION, Shape::ub4, Get<Statement, S::Position>, nullptr},
+    {OCI_ATTR_STMT_IS_RETURNING, Shape::ub1, Get<Statement, S::IsReturning>, nullptr},
+    {OCI_ATTR_PARSE_ERROR_OFFSET, Shape::ub2, Get<Statement, S::ErrorOffset>, nullptr},
+    {OCI_ATTR_ROWID, Shape::descriptor, Get<Statement, S::RowId>, nullptr},
+    {OCI_ATTR_PREFETCH_ROWS, Shape::ub4, GetField<&Statement::prefetch_rows>, SetField<&Statement::prefetch_rows>},
+    {OCI_ATTR_PREFETCH_MEMORY, Shape::ub4, GetField<&Statement::prefetch_memory>, SetField<&Statement::prefetch_memory>},
+    {OCI_ATTR_NESTED_PREFETCH_ROWS, Shape::ub4, GetField<&Statement::nested_prefetch_rows>,
+     SetField<&Statement::nested_prefetch_rows>},
+    {OCI_ATTR_NESTED_PREFETCH_MEMORY, Shape::ub4, GetField<&Statement::nested_prefetch_memory>,
+     SetField<&Statement::nested_prefetch_memory>},
+};
+
+}  // namespace
+
+std::span<const AttributeRow> Statement::Attributes() const { return kRows; }
