@@ -67,13 +67,10 @@ private:
 
     bool Place(bool zero) {
         if (model_.scientific || model_.currency == Currency::trailing) return false;
-        if (model_.point == 0) {
-            ++model_.places_before;
-            if (model_.zeros_before > 0 || zero) ++model_.zeros_before;
-        } else {
-            ++model_.places_after;
-            if (zero) model_.zeros_after = model_.places_after;
-        }
+        const bool whole = model_.point == 0 || model_.point == 'V';
+        ++(model_.point == 0 ? model_.places_before : model_.places_after);
+        if (whole && (model_.zeros_before > 0 || zero)) ++model_.zeros_before;
+        if (!whole && zero) model_.zeros_after = model_.places_after;
         return true;
     }
 

@@ -23,7 +23,7 @@ struct FormatModel {
     char point = 0;                 // '.', 'D', 'V', the element of a currency that stands for it, or 0
     int places_before = 0;          // digit places
     int places_after = 0;           // behind the point or the V
-    int zeros_before = 0;           // places before the point that are always digits
+    int zeros_before = 0;           // places before the point, or the end with V, that are always digits
     int zeros_after = 0;            // places after it up to the last 0
     bool groups = false;
     std::string_view whole;         // the elements before the point: 9, 0, comma and G count, others are passed over

@@ -84,10 +84,10 @@ void PutWhole(const Job& job, Writer* out) {
     bool started = false;
     const auto put_place = [&](bool last_when_zero) {
         --place;
-        started = started || place < job.decimal.point || place < model.zeros_before + after || (last_when_zero && place == 0);
+        started = started || place < job.decimal.point || place < model.zeros_before || (last_when_zero && place == 0);
         if (started) out->Put(job.Digit(place));
     };
-    const bool units_zero = PlacesShown(job) == 0 || (model.point == 'V');
+    const bool units_zero = PlacesShown(job) == 0 || model.point == 'V';
     for (const char element : model.whole) {
         if (IsPlace(element)) put_place(units_zero);
         else if (IsGroup(element) && started) out->Put(element == ',' ? ',' : job.nls.group);

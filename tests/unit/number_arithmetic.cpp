@@ -1,0 +1,210 @@
+// Arithmetic on numbers, against exact fractions.
+#include <gtest/gtest.h>
+
+#include "number_reference.h"
+
+namespace {
+
+// Runs `function` and compares error or bytes with what the exact result must be rounded to.
+void ExpectRounded(const char* name, number::Errno error, const OCINumber& got, Fraction& exact, const std::string& operands) {
+    OCINumber wanted;
+    const number::Errno wanted_error = exact.Rounded(&wanted);
+    ASSERT_EQ(error, wanted_error) << name << " " << operands;
+    if (!error) {
+        ASSERT_EQ(got, wanted) << name << " " << operands;
+    }
+}
+
+// *value = the whole number next to it toward zero.
+void CutToWhole(Fraction& value) {
+    mpz_tdiv_q(mpq_numref(static_cast<mpq_ptr>(value)), mpq_numref(static_cast<mpq_ptr>(value)),
+               mpq_denref(static_cast<mpq_ptr>(value)));
+    mpz_set_ui(mpq_denref(static_cast<mpq_ptr>(value)), 1);
+}
+
+}  // namespace
+
+TEST(NumberArithmetic, FourOperationsRoundTheExactResultOnce) {
+    const struct {
+        const char* name;
+        number::Binary function;
+        void (*exact)(mpq_ptr, mpq_srcptr, mpq_srcptr);
+    } operations[] = {{"add", number::Add, mpq_add}, {"sub", number::Sub, mpq_sub},
+                      {"mul", number::Mul, mpq_mul}, {"div", number::Div, mpq_div}};
+    RandomNumbers numbers(1);
+    for (int i = 0; i < 4000; ++i) {
+        const int spread = i % 4 == 0 ? 62 : i % 4 == 1 ? 0 : 12;
+        const OCINumber a = numbers.Next(spread);
+        OCINumber b = i % 10 == 0 ? a : numbers.Next(spread);
+        if (i % 20 == 0) number::Neg(a, &b);
+        for (const auto& operation : operations) {
+            Fraction left(a), right(b), exact;
+            operation.exact(exact, left, right);
+            OCINumber got;
+            const number::Errno error = operation.function(a, b, &got);
+            ASSERT_NO_FATAL_FAILURE(ExpectRounded(operation.name, error, got, exact, Shown(a) + " " + Shown(b)));
+        }
+    }
+}
+
+TEST(NumberArithmetic, RemainderIsExactAndHasTheSignOfTheFirst) {
+    RandomNumbers numbers(2);
+    for (int i = 0; i < 2000; ++i) {
+        const OCINumber a = numbers.Next(i % 2 ? 62 : 10), b = numbers.Next(i % 2 ? 62 : 10);
+        Fraction left(a), right(b), quotient, exact;
+        mpq_div(quotient, left, right);
+        CutToWhole(quotient);
+        mpq_mul(quotient, quotient, right);
+        mpq_sub(exact, left, quotient);
+        OCINumber got;
+        ASSERT_NO_FATAL_FAILURE(ExpectRounded("mod", number::Mod(a, b, &got), got, exact, Shown(a) + " " + Shown(b)));
+    }
+}
+
+TEST(NumberArithmetic, RoundingAndCuttingAtAnyPlace) {
+    RandomNumbers numbers(3);
+    for (int i = 0; i < 4000; ++i) {
+        const OCINumber a = numbers.Next(i % 3 ? 10 : 62);
+        const int places = numbers.Below(60) - 30;
+        Fraction scale(Number("1")), half(Number("0.5")), scaled(a), rounded;
+        for (int power = 0; power < (places < 0 ? -places : places); ++power)
+            mpz_mul_ui(mpq_numref(static_cast<mpq_ptr>(scale)), mpq_numref(static_cast<mpq_ptr>(scale)), 10);
+        if (places < 0) mpq_inv(scale, scale);
+        mpq_mul(scaled, scaled, scale);
+        if (mpq_sgn(static_cast<mpq_ptr>(scaled)) < 0) mpq_sub(rounded, scaled, half);
+        else mpq_add(rounded, scaled, half);
+        CutToWhole(rounded);
+        CutToWhole(scaled);
+        mpq_div(rounded, rounded, scale);
+        mpq_div(scaled, scaled, scale);
+        const std::string shown = Shown(a) + " at " + std::to_string(places);
+        OCINumber got;
+        ASSERT_NO_FATAL_FAILURE(ExpectRounded("round", number::Round(a, places, &got), got, rounded, shown));
+        ASSERT_NO_FATAL_FAILURE(ExpectRounded("trunc", number::Trunc(a, places, &got), got, scaled, shown));
+        Fraction moved(a);
+        for (int power = 0; power < places; ++power) mpq_mul(moved, moved, Fraction(Number("10")));
+        for (int power = 0; power > places; --power) mpq_div(moved, moved, Fraction(Number("10")));
+        ASSERT_NO_FATAL_FAILURE(ExpectRounded("shift", number::Shift(a, places, &got), got, moved, shown));
+    }
+}
+
+TEST(NumberArithmetic, SquareRootOfASquareAndBetweenNeighbours) {
+    RandomNumbers numbers(4);
+    for (int i = 0; i < 2000; ++i) {
+        OCINumber a = numbers.Next(i % 2 ? 60 : 5), root;
+        ASSERT_EQ(number::Abs(a, &a), 0);
+        ASSERT_EQ(number::Sqrt(a, &root), 0);
+        // root is right when (root - half a unit)^2 <= a < (root + half a unit)^2.
+        OCINumber unit{{2, root.OCINumberPart[1], 2}}, half_unit;
+        ASSERT_EQ(number::Shift(unit, -38, &unit), 0);
+        ASSERT_EQ(number::Div(unit, Number("2"), &half_unit), 0);
+        Fraction low(root), high(root), half(half_unit), value(a);
+        mpq_sub(low, low, half);
+        mpq_add(high, high, half);
+        mpq_mul(low, low, low);
+        mpq_mul(high, high, high);
+        ASSERT_LE(mpq_cmp(low, value), 0) << Shown(a);
+        ASSERT_LT(mpq_cmp(value, high), 0) << Shown(a);
+    }
+}
+
+TEST(NumberArithmetic, UnaryFunctionsAtTheirEdges) {
+    const struct { number::Unary function; const char* value; const char* result; } cases[] = {
+        {number::Ceil, "0.0000001", "1"},      {number::Ceil, "-0.9", "0"},      {number::Ceil, "1E-130", "1"},
+        {number::Ceil, "99.5", "100"},         {number::Floor, "-1E-130", "-1"}, {number::Floor, "-99.5", "-100"},
+        {number::Floor, "9.99", "9"},          {number::Ceil, "1E100", "1E100"}, {number::Inc, "99", "100"},
+        {number::Dec, "0", "-1"},              {number::Dec, "100", "99"},       {number::Inc, "1E42", "1"},
+        {number::Dec, "1E125", "-1"},          {number::Abs, "-5", "5"},         {number::Neg, "0", "0"},
+        {number::Inc, "9999999999999999999999999999999999999999", "1E40"}};
+    for (const auto& c : cases) {
+        OCINumber got;
+        ASSERT_EQ(c.function(Number(c.value), &got), 0) << c.value;
+        EXPECT_EQ(got, Number(c.result)) << c.value;
+    }
+}
+
+TEST(NumberArithmetic, PrecisionCountsFromTheFirstDigit) {
+    const struct { const char* value; int digits; const char* result; } cases[] = {
+        {"123.456", 4, "123.5"}, {"9.96", 2, "10"}, {"0.0099999", 2, "0.01"}, {"95", 1, "100"}, {"-1.5", 1, "-2"},
+        {"12345", 40, "12345"},  {"0", 3, "0"},     {"0.05", 1, "0.05"},      {"5", 2000000000, "5"}};
+    for (const auto& c : cases) {
+        OCINumber got;
+        ASSERT_EQ(number::Prec(Number(c.value), c.digits, &got), 0) << c.value;
+        EXPECT_EQ(got, Number(c.result)) << c.value << " to " << c.digits;
+    }
+    OCINumber got;
+    EXPECT_EQ(number::Prec(Number("1"), 0, &got), number::kBadArgument);
+    EXPECT_EQ(number::Shift(Number("1"), 2147483647, &got), number::kOverflow);
+    EXPECT_EQ(number::Shift(Number("1"), -2147483647 - 1, &got), number::kUnderflow);
+    EXPECT_EQ(number::Round(Number("1"), -2147483647 - 1, &got), 0);
+    EXPECT_EQ(got, Number("0"));
+}
+
+TEST(NumberArithmetic, RangeAndDomainErrors) {
+    const struct { number::Binary function; const char* left; const char* right; number::Errno error; } cases[] = {
+        {number::Add, "9.9E125", "9.9E125", number::kOverflow}, {number::Mul, "1E100", "1E26", number::kOverflow},
+        {number::Mul, "1E-100", "1E-31", number::kUnderflow},   {number::Sub, "1.01E-130", "1E-130", number::kUnderflow},
+        {number::Div, "1", "0", number::kDividedByZero},        {number::Div, "0", "0", number::kDividedByZero},
+        {number::Mod, "5", "0", number::kDividedByZero},        {number::Div, "1E-100", "1E31", number::kUnderflow}};
+    for (const auto& c : cases) {
+        OCINumber got;
+        EXPECT_EQ(c.function(Number(c.left), Number(c.right), &got), c.error) << c.left << " " << c.right;
+    }
+}
+
+TEST(NumberArithmetic, BytesThatAreNoNumber) {
+    const OCINumber malformed[] = {
+        {{0, 128}},      {{22, 193, 2}}, {{255, 193, 2}}, {{1, 129}},          {{1, 193}},        {{2, 193, 0}},
+        {{2, 193, 102}}, {{2, 255, 102}}, {{3, 193, 2, 255}}, {{3, 62, 1, 102}}, {{3, 62, 103, 102}}, {{2, 62, 102}}};
+    for (const OCINumber& value : malformed) {
+        OCINumber got;
+        int tested = 0;
+        EXPECT_FALSE(number::IsValid(value)) << int{value.OCINumberPart[0]} << " " << int{value.OCINumberPart[1]};
+        EXPECT_EQ(number::Add(value, Number("1"), &got), number::kBadNumber);
+        EXPECT_EQ(number::Sub(Number("1"), value, &got), number::kBadNumber);
+        EXPECT_EQ(number::Sin(value, &got), number::kBadNumber);
+        EXPECT_EQ(number::Compare(value, value, &tested), number::kBadNumber);
+    }
+}
+
+TEST(NumberArithmetic, BytesOfKnownValues) {
+    const struct { const char* value; OCINumber bytes; } cases[] = {
+        {"0", {{1, 0x80}}},          {"1", {{2, 0xC1, 2}}},          {"100", {{2, 0xC2, 2}}},
+        {"0.01", {{2, 0xC0, 2}}},    {"-1", {{3, 0x3E, 0x64, 0x66}}}, {"-5", {{3, 0x3E, 0x60, 0x66}}},
+        {"123.45", {{4, 0xC2, 2, 0x18, 0x2E}}}, {"-123.45", {{5, 0x3D, 0x64, 0x4E, 0x38, 0x66}}}, {"1E-130", {{2, 0x80, 2}}}};
+    for (const auto& c : cases) EXPECT_EQ(Number(c.value), c.bytes) << c.value;
+    OCINumber pi;
+    number::SetPi(&pi);
+    EXPECT_EQ(pi, Number("3.1415926535897932384626433832795028842"));
+}
+
+// Unused bytes, leading zeros and a missing terminator come from callers that build numbers themselves.
+TEST(NumberArithmetic, UnusualBytesOfTheSameValue) {
+    const struct { OCINumber bytes; const char* value; } cases[] = {
+        {{{2, 193, 6, 255, 0, 102, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7}}, "5"},
+        {{{3, 194, 1, 6}}, "5"},
+        {{{2, 62, 96}}, "-5"},
+        {{{3, 193, 6, 1}}, "5"},
+        {{{2, 193, 1}}, "0"}};
+    for (const auto& c : cases) {
+        OCINumber got;
+        ASSERT_EQ(number::Add(c.bytes, Number("1"), &got), 0) << c.value;
+        OCINumber wanted;
+        ASSERT_EQ(number::Add(Number(c.value), Number("1"), &wanted), 0);
+        EXPECT_EQ(got, wanted) << c.value;
+    }
+}
+
+TEST(NumberArithmetic, InfinitiesCompareButDoNotCompute) {
+    const OCINumber plus{{2, 255, 101}}, minus{{1, 0}};
+    int order = 0;
+    ASSERT_EQ(number::Compare(minus, Number("-9E125"), &order), 0);
+    EXPECT_EQ(order, -1);
+    ASSERT_EQ(number::Compare(plus, plus, &order), 0);
+    EXPECT_EQ(order, 0);
+    OCINumber got;
+    ASSERT_EQ(number::Neg(plus, &got), 0);
+    EXPECT_EQ(got, minus);
+    EXPECT_EQ(number::Add(plus, minus, &got), number::kOverflow);
+    EXPECT_EQ(number::Cos(plus, &got), number::kOverflow);
+}

@@ -1,0 +1,204 @@
+// The functions that have no exact decimal result, against MPFR at a precision that leaves no doubt.
+#include <gtest/gtest.h>
+#include <mpfr.h>
+
+#include <thread>
+#include <vector>
+
+#include "number_reference.h"
+
+namespace {
+
+constexpr mpfr_prec_t kReferenceBits = 2000;
+
+class Reference {
+public:
+    Reference() { mpfr_init2(value_, kReferenceBits); }
+    explicit Reference(const OCINumber& value) : Reference() { mpfr_set_q(value_, Fraction(value), MPFR_RNDN); }
+    ~Reference() { mpfr_clear(value_); }
+    Reference(const Reference&) = delete;
+    Reference& operator=(const Reference&) = delete;
+    operator mpfr_ptr() { return value_; }
+
+    // compute(value), noting whether it was too small even for MPFR.
+    template <class Compute> void Set(Compute compute) {
+        mpfr_clear_flags();
+        compute(static_cast<mpfr_ptr>(value_));
+        underflow_ = mpfr_underflow_p() != 0;
+    }
+
+    // Compares a computed number with this value.
+    void Expect(const char* name, number::Errno error, const OCINumber& got, const std::string& operands) {
+        OCINumber wanted;
+        number::Errno wanted_error;
+        if (mpfr_inf_p(value_) || (mpfr_regular_p(value_) && mpfr_get_exp(value_) > 500)) {
+            wanted_error = number::kOverflow;
+        } else if (underflow_ || (mpfr_regular_p(value_) && mpfr_get_exp(value_) < -500)) {
+            wanted_error = number::kUnderflow;
+        } else {
+            Fraction exact;
+            mpfr_get_q(exact, value_);
+            wanted_error = exact.Rounded(&wanted);
+        }
+        ASSERT_EQ(error, wanted_error) << name << " " << operands;
+        if (!error) {
+            ASSERT_EQ(got, wanted) << name << " " << operands;
+        }
+    }
+
+private:
+    mpfr_t value_;
+    bool underflow_ = false;
+};
+
+struct Function {
+    const char* name;
+    number::Unary function;
+    int (*reference)(mpfr_ptr, mpfr_srcptr, mpfr_rnd_t);
+};
+constexpr Function kFunctions[] = {
+    {"exp", number::Exp, mpfr_exp},        {"sin", number::Sin, mpfr_sin},        {"cos", number::Cos, mpfr_cos},
+    {"tan", number::Tan, mpfr_tan},        {"arctan", number::ArcTan, mpfr_atan}, {"hypsin", number::HypSin, mpfr_sinh},
+    {"hypcos", number::HypCos, mpfr_cosh}, {"hyptan", number::HypTan, mpfr_tanh}};
+constexpr Function kInverse[] = {{"arcsin", number::ArcSin, mpfr_asin}, {"arccos", number::ArcCos, mpfr_acos}};
+
+void ExpectFunction(const Function& row, const OCINumber& value) {
+    OCINumber got;
+    const number::Errno error = row.function(value, &got);
+    Reference reference(value);
+    reference.Set([&](mpfr_ptr real) { row.reference(real, real, MPFR_RNDN); });
+    reference.Expect(row.name, error, got, Shown(value));
+}
+
+void ExpectEverywhere(const OCINumber& value) {
+    for (const Function& row : kFunctions) ASSERT_NO_FATAL_FAILURE(ExpectFunction(row, value));
+    int beyond = 0;
+    OCINumber magnitude;
+    number::Abs(value, &magnitude);
+    number::Compare(magnitude, Number("1"), &beyond);
+    for (const Function& row : kInverse) {
+        OCINumber got;
+        if (beyond > 0) {
+            ASSERT_EQ(row.function(value, &got), number::kBadNumber) << row.name << " " << Shown(value);
+        } else {
+            ASSERT_NO_FATAL_FAILURE(ExpectFunction(row, value));
+        }
+    }
+    int sign = 0;
+    number::Sign(value, &sign);
+    const Function logarithm{"ln", number::Ln, mpfr_log};
+    OCINumber got;
+    if (sign <= 0) {
+        ASSERT_EQ(number::Ln(value, &got), number::kBadNumber) << Shown(value);
+    } else {
+        ASSERT_NO_FATAL_FAILURE(ExpectFunction(logarithm, value));
+    }
+}
+
+}  // namespace
+
+TEST(NumberFunctions, AtRandomArguments) {
+    RandomNumbers numbers(11);
+    for (int i = 0; i < 300; ++i) ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(numbers.Next(i % 4 == 0 ? 60 : 1)));
+}
+
+TEST(NumberFunctions, NextToMultiplesOfPi) {
+    for (const char* factor : {"0.25", "0.5", "1", "1.5", "2", "3", "22", "1000", "1E20", "123456789E30"}) {
+        OCINumber value;
+        number::SetPi(&value);
+        ASSERT_EQ(number::Mul(value, Number(factor), &value), 0);
+        ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(value));
+        ASSERT_EQ(number::Neg(value, &value), 0);
+        ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(value));
+    }
+}
+
+TEST(NumberFunctions, AtTheEndsOfTheRange) {
+    for (const char* value :
+         {"0", "1", "-1", "1E-130", "-1E-130", "9.999E125", "-9.999E125", "290", "290.12", "290.2", "-299.3", "-299.4",
+          "0.9999999999999999999999999999999999999999", "-0.9999999999999999999999999999999999999999",
+          "1.00000000000000000000000000000000000001", "0.5", "-0.5"})
+        ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(Number(value)));
+}
+
+// Results a hair away from the middle between two numbers: the first bits say "tie", only later ones decide.
+TEST(NumberFunctions, NextToTies) {
+    for (const char* value : {"-1E-20", "1E-20", "5E-39", "-5E-41", "1E-19", "1.5E-38", "5E-20", "1E-60", "-7E-20"})
+        ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(Number(value)));
+}
+
+TEST(NumberFunctions, FunctionsOfTwoNumbers) {
+    RandomNumbers numbers(12);
+    for (int i = 0; i < 300; ++i) {
+        OCINumber a = numbers.Next(i % 3 == 0 ? 30 : 2), b = numbers.Next(i % 5 == 0 ? 60 : 1), got;
+        const std::string operands = Shown(a) + " " + Shown(b);
+        Reference a_real(a), b_real(b), result;
+        result.Set([&](mpfr_ptr real) { mpfr_atan2(real, a_real, b_real, MPFR_RNDN); });
+        ASSERT_NO_FATAL_FAILURE(result.Expect("arctan2", number::ArcTan2(a, b, &got), got, operands));
+        number::Abs(a, &a);
+        mpfr_abs(a_real, a_real, MPFR_RNDN);
+        result.Set([&](mpfr_ptr real) { mpfr_pow(real, a_real, b_real, MPFR_RNDN); });
+        ASSERT_NO_FATAL_FAILURE(result.Expect("power", number::Power(a, b, &got), got, operands));
+        number::Abs(b, &b);
+        mpfr_abs(b_real, b_real, MPFR_RNDN);
+        mpfr_log(a_real, a_real, MPFR_RNDN);
+        mpfr_log(b_real, b_real, MPFR_RNDN);
+        if (mpfr_zero_p(static_cast<mpfr_ptr>(a_real))) continue;
+        result.Set([&](mpfr_ptr real) { mpfr_div(real, b_real, a_real, MPFR_RNDN); });
+        ASSERT_NO_FATAL_FAILURE(result.Expect("log", number::Log(a, b, &got), got, operands));
+    }
+}
+
+TEST(NumberFunctions, PowersThatAreExact) {
+    const struct { const char* base; const char* exponent; const char* result; } cases[] = {
+        {"2", "10", "1024"},        {"2", "-3", "0.125"},   {"4", "0.5", "2"},      {"0.25", "-1.5", "8"},
+        {"-2", "3", "-8"},          {"-2", "4", "16"},      {"0", "0", "1"},        {"0", "2.5", "0"},
+        {"7", "0", "1"},            {"10", "-130", "1E-130"}, {"10", "125", "1E125"}, {"1", "1E125", "1"},
+        {"-1", "1E125", "1"},       {"-1", "-7", "-1"},     {"9.5367431640625E-7", "0.05", "0.5"},
+        // Exact ties, rounded away from zero: 41 digits with a 5 at the end.
+        {"1.00000000000000000005", "2", "1.0000000000000000001"},
+        {"-3.00000000000000000005", "2", "9.0000000000000000003"},
+        {"1.0000000000000000001000000000000000000025", "0.5", "1.00000000000000000005"}};
+    for (const auto& c : cases) {
+        OCINumber got;
+        ASSERT_EQ(number::Power(Number(c.base), Number(c.exponent), &got), 0) << c.base << " " << c.exponent;
+        EXPECT_EQ(got, Number(c.result)) << c.base << " " << c.exponent;
+    }
+    OCINumber got;
+    ASSERT_EQ(number::Log(Number("4"), Number("8"), &got), 0);
+    EXPECT_EQ(got, Number("1.5"));
+    ASSERT_EQ(number::IntPower(Number("1.5"), -2147483647 - 1, &got), number::kUnderflow);
+    ASSERT_EQ(number::IntPower(Number("-1"), 2147483647, &got), 0);
+    EXPECT_EQ(got, Number("-1"));
+}
+
+TEST(NumberFunctions, OutsideTheDomain) {
+    const struct { number::Binary function; const char* left; const char* right; number::Errno error; } cases[] = {
+        {number::Power, "0", "-1", number::kDividedByZero}, {number::Power, "-2", "0.5", number::kBadNumber},
+        {number::Log, "1", "5", number::kBadNumber},        {number::Log, "0", "5", number::kBadNumber},
+        {number::Log, "-2", "5", number::kBadNumber},       {number::Log, "2", "0", number::kBadNumber},
+        {number::ArcTan2, "0", "0", number::kBadNumber},    {number::Power, "10", "126", number::kOverflow},
+        {number::Power, "10", "-131", number::kUnderflow},  {number::Power, "9E125", "9E125", number::kOverflow}};
+    for (const auto& c : cases) {
+        OCINumber got;
+        EXPECT_EQ(c.function(Number(c.left), Number(c.right), &got), c.error) << c.left << " " << c.right;
+    }
+    OCINumber got;
+    EXPECT_EQ(number::Sqrt(Number("-1E-130"), &got), number::kBadNumber);
+}
+
+TEST(NumberFunctions, FromSeveralThreads) {
+    OCINumber wanted;
+    ASSERT_EQ(number::Sin(Number("2"), &wanted), 0);
+    std::vector<std::thread> threads;
+    std::vector<int> wrong(8, 0);
+    for (int& count : wrong)
+        threads.emplace_back([&wanted, &count] {
+            for (int i = 0; i < 50; ++i) {
+                OCINumber got;
+                count += number::Sin(Number("2"), &got) != 0 || !(got == wanted);
+            }
+        });
+    for (std::thread& thread : threads) thread.join();
+    for (const int count : wrong) EXPECT_EQ(count, 0);
+}
