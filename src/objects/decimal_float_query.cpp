@@ -15,11 +15,14 @@ constexpr char kQuery[] = "values( cast( cast(:1 as decfloat(34)) as varchar(100
 constexpr uint32_t kLongestText = 43;   // of 34 digits, closing zero included
 constexpr uint32_t kShorterText = 24;   // of 16 digits
 
-// A service context made from the default environment.
+// A service context made from the default environment, else the first there is.
 OCISvcCtx* AnyServiceContext() {
-    for (const NamedObject& slot : SlotsOf(Kind::svc))
-        if (slot.in_use && slot.parent == DefaultEnvironment) return static_cast<OCISvcCtx*>(slot.object);
-    return nullptr;
+    const NamedObject* any = nullptr;
+    for (const NamedObject& slot : SlotsOf(Kind::svc)) {
+        if (!slot.in_use) continue;
+        if (any == nullptr || (any->parent != DefaultEnvironment && slot.parent == DefaultEnvironment)) any = &slot;
+    }
+    return any == nullptr ? nullptr : static_cast<OCISvcCtx*>(any->object);
 }
 
 // The query as the environment takes its texts.

@@ -2,7 +2,7 @@
 // at. No client library is loaded unless HARNIX_CLIENT_LIBRARY names one, so that the driver's own code is what runs.
 //
 //   cmake -B build/fuzz -DCMAKE_CXX_COMPILER=clang++ -DHARNIX_SANITIZE=address,undefined,fuzzer-no-link
-//   cmake --build build/fuzz --target script_fuzz && build/fuzz/bin/script_fuzz tests/fuzz/corpus
+//   cmake --build build/fuzz --target script_fuzz && build/fuzz/bin/script_fuzz "$PWD/tests/fuzz/corpus"
 //
 // A finding is mended and its input stays in the corpus, which a test replays.
 #include <algorithm>
