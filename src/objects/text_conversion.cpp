@@ -171,10 +171,6 @@ bool TextArgument::Convert(const char* word, uint32_t length, TextArea area) {
         Message(kError, "cbOutLen is zero\n");
         return false;
     }
-    if (length > kReadableText) {
-        Message(kError, "Could not allocate memory\n");
-        return false;
-    }
     const char* input = word;
     if (length > kTokenBufferSize && !Pad(word, input)) return false;
     converted_.reset(static_cast<char*>(GetMem(size)));

@@ -138,7 +138,7 @@ TEST_F(Texts, ArgumentsInUtf16Mode) {
     EXPECT_EQ(argument.Length(), 0u);
     EXPECT_NE(argument.Text(), nullptr);
     EXPECT_EQ(Printed([&] { EXPECT_FALSE(argument.Set(Token("scott"), -1, TextArea::four_times)); }),
-              "Could not allocate memory\n");
+              "GetMem: failed to allocate memory.\nCould not allocate memory\n");
     EXPECT_EQ(Printed([&] { EXPECT_TRUE(argument.Set("null", 4, TextArea::four_times)); }), "");
     EXPECT_EQ(argument.Text(), nullptr);
 }
