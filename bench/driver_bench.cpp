@@ -129,13 +129,14 @@ void WriteAll(int descriptor, const std::string& text) {
     }
 }
 
-// Waits until the driver has made the file that the last command of a batch asks for, so that all before it ran.
-void AwaitFile(const fs::path& file) {
-    for (int tries = 0; !fs::exists(file); ++tries) {
-        if (tries > 60000) Fail("the driver did not finish a batch");
+// Feeds the driver and waits until it ran all of it: the last command deletes a file.
+void Feed(int descriptor, const std::string& commands, const fs::path& mark) {
+    std::ofstream(mark) << "here\n";
+    WriteAll(descriptor, commands + "deletefile " + mark.string() + "\n");
+    for (int tries = 0; fs::exists(mark); ++tries) {
+        if (tries > 60000) Fail("the driver did not finish what it was fed");
         usleep(10000);
     }
-    fs::remove(file);
 }
 
 std::string MixedCommands(int count) {
@@ -150,7 +151,7 @@ std::string MixedCommands(int count) {
 }
 
 void Memory(const Bench& bench) {
-    const fs::path mark = bench.folder / "mark.db";
+    const fs::path mark = bench.folder / "mark";
     int ends[2];
     if (pipe(ends) != 0) Fail("no pipe");
     posix_spawn_file_actions_t actions;
@@ -165,13 +166,9 @@ void Memory(const Bench& bench) {
     posix_spawn_file_actions_destroy(&actions);
     close(ends[0]);
 
-    const std::string wait = "quickconnectoci e1 r1 s1 " + mark.string() + "\nkillenvoci e1 r1 s1\n";
-    WriteAll(ends[1], "quickconnectoci env err svc :memory:\n" + MixedCommands(1000) + wait);
-    AwaitFile(mark);
+    Feed(ends[1], "quickconnectoci env err svc :memory:\n" + MixedCommands(1000), mark);
     const long before = ResidentKilobytes(child);
-    for (int batch = 0; batch < 100; ++batch) WriteAll(ends[1], MixedCommands(10000));
-    WriteAll(ends[1], wait);
-    AwaitFile(mark);
+    for (int batch = 0; batch < 100; ++batch) Feed(ends[1], MixedCommands(10000), mark);
     const long after = ResidentKilobytes(child);
     close(ends[1]);
     waitpid(child, nullptr, 0);
@@ -206,7 +203,7 @@ void Run(const Bench& bench) {
 
     Bench often = bench;
     often.runs = 101;
-    Pair(often, "start to first prompt / an empty program", 3.0, {{harnix}, nothing}, {{baselines, "empty"}, nothing});
+    Pair(often, "start to first prompt / an empty program", 3.0, {{harnix}, nothing}, {{bench.binaries / "empty"}, nothing});
     Memory(bench);
 }
 

@@ -1,0 +1,4 @@
+// What starting a process costs.
+#include <iostream>
+
+int main() { return 0; }
