@@ -6,6 +6,7 @@
 
 #include "date/date.h"
 #include "sql/token_list.h"
+#include "values/rowid.h"
 
 namespace sql {
 namespace {
@@ -24,7 +25,7 @@ class Rewriter {
 public:
     Rewriter(std::string_view text, const StatementText& statement, const Step& step, const engine::Dialect& dialect)
         : text_(text), statement_(statement), step_(step), dialect_(dialect),
-          tokens_(Tokenize(text, step.begin, step.end)),
+          tokens_(Tokenize(text, step.begin, step.end)), row_ids_(RowIdOperands(tokens_)),
           names_columns_(statement.type == StatementType::create || statement.type == StatementType::alter),
           defines_code_(DefinesCode(tokens_)) {
         if (!dialect.casts.empty()) FindCasts();
@@ -55,6 +56,7 @@ private:
         if (token.begin >= step_.cut_begin && token.begin < step_.cut_end) return Drop(index, step_.cut_end);
         switch (token.kind) {
             case TokenKind::placeholder: return VisitPlaceholder(index);
+            case TokenKind::literal: VisitLiteral(index); break;
             case TokenKind::q_literal: Replace(token, token.End(), PlainLiteral(token.text)); break;
             case TokenKind::symbol: VisitSymbol(index); break;
             case TokenKind::word: return VisitWord(index);
@@ -74,6 +76,14 @@ private:
         Replace(token, tokens_[index + has_indicator].End(),
                 dialect_.placeholder_mark + std::to_string(result_.placeholders.size()));
         return index + 1 + has_indicator;
+    }
+
+    // A row id's text that is compared with one becomes the engine's number of the row.
+    void VisitLiteral(std::size_t index) {
+        const Token& token = tokens_[index];
+        rowid::RowId value;
+        if (row_ids_[index] && rowid::FromText(token.text.substr(1, token.text.size() - 2), &value))
+            Replace(token, token.End(), std::to_string(value.row));
     }
 
     void VisitSymbol(std::size_t index) {
@@ -254,6 +264,7 @@ private:
     const Step& step_;
     const engine::Dialect& dialect_;
     std::vector<Token> tokens_;
+    std::vector<bool> row_ids_;    // by token: what is compared with row ids
     const bool names_columns_;
     const bool defines_code_;
     std::vector<Open> open_;
