@@ -237,14 +237,17 @@ TEST_F(EngineTest, ColumnsTakeWhatTheirDeclarationSays) {
 TEST_F(EngineTest, ColumnsAreDescribed) {
     ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR (5), d timestamp_tz(3), "
                   "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5))"), 0);
-    const auto query = Prepare("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid from t");
+    const auto query = Prepare("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
+                               "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', count(kelp_date(b )) from t");
     struct Expected { const char* name; int type; unsigned size; int precision; int scale; bool nullable; };
     const Expected expected[] = {
         {"A", SQLT_NUM, 22, 12, 2, false},   {"Mixed", SQLT_CHR, 20, 0, 0, true},  {"C", SQLT_AFC, 5, 0, 0, true},
         {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true}, {"E", SQLT_NUM, 22, 0, -127, true}, {"F", SQLT_CLOB, 4000, 0, 0, true},
         {"G", SQLT_CHR, 0, 0, 0, true},      {"ID", SQLT_NUM, 22, 38, 0, false},   {"H", SQLT_BDOUBLE, 16, 34, -127, true},
         {"I", SQLT_NUM, 22, 5, 0, true},     {"1+1", SQLT_CHR, 0, 0, 0, true},     {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true},
-        {"ID", SQLT_RDD, 18, 0, 0, false}};
+        {"ID", SQLT_RDD, 18, 0, 0, false},
+        {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
+        {"COUNT(CAST(B AS DATE))", SQLT_CHR, 0, 0, 0, true}};
     const auto& columns = query->Columns();
     ASSERT_EQ(columns.size(), std::size(expected));
     for (std::size_t index = 0; index < columns.size(); ++index) {

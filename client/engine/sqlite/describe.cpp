@@ -1,6 +1,9 @@
 #include "engine/sqlite/describe.h"
 
+#include <algorithm>
+
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/functions.h"
 #include "engine/sqlite/pieces.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/stored_number.h"
@@ -20,10 +23,48 @@ void MakeNumber(Column& column) {
     column.scale = kFloating;
 }
 
+std::string_view Trimmed(std::string_view text) {
+    while (!text.empty() && text.front() == ' ') text.remove_prefix(1);
+    while (!text.empty() && text.back() == ' ') text.remove_suffix(1);
+    return text;
+}
+
+// An expression as the application wrote it: kelp_number(a , 5, 2) was cast(a as number(5, 2)).
+std::string AsWritten(std::string_view text) {
+    Pieces pieces(text);
+    const Dialect::Spelling* cast = nullptr;
+    std::size_t begin = 0;
+    std::size_t open = 0;
+    std::size_t comma = 0;
+    int depth = 0;
+    for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
+        if (!cast) {
+            const auto found = std::find_if(std::begin(kCasts), std::end(kCasts),
+                                            [&](const auto& row) { return IsWord(piece, row.engine); });
+            if (found == std::end(kCasts)) continue;
+            cast = &*found;
+            begin = pieces.At() - piece.size();
+            open = pieces.At() + 1;
+        } else if (piece == "(") {
+            ++depth;
+        } else if (piece == "," && depth == 1 && comma == 0) {
+            comma = pieces.At() - 1;
+        } else if (piece == ")" && --depth == 0) {
+            const std::size_t close = pieces.At() - 1;
+            std::string written(text.substr(0, begin));
+            written += "cast(" + AsWritten(Trimmed(text.substr(open, (comma ? comma : close) - open))) + " as ";
+            written += cast->written;
+            if (comma) written.append("(").append(Trimmed(text.substr(comma + 1, close - comma - 1))).append(")");
+            return written + ")" + AsWritten(text.substr(close + 1));
+        }
+    }
+    return std::string(text);
+}
+
 // Names that were not quoted are shown in upper case. A name that stands quoted in the statement was.
 std::string ShownName(std::string_view name, std::string_view sql) {
     if (sql.find('"' + std::string(name) + '"') != std::string_view::npos) return std::string(name);
-    std::string shown(name);
+    std::string shown = name.find("kelp_") == std::string_view::npos ? std::string(name) : AsWritten(name);
     char quote = '\0';
     for (char& c : shown) {
         if (quote != '\0') {
