@@ -29,6 +29,9 @@ Status GetStatus(Server& server, AttributeValue& value) {
     return {};
 }
 
+// A failover callback is never called: an embedded database does not fail over.
+Status TakeFailover(Object&, const AttributeValue&) { return {}; }
+
 Status GetBusy(Server&, AttributeValue&) { return {}; }    // a call that asks has the connection to itself
 
 Status GetInCurrentMode(Server&, AttributeValue& value) {
@@ -45,6 +48,7 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, Get<Server, GetNonBlocking>, ToggleNonBlocking},
     {OCI_ATTR_INTERNAL_NAME, Shape::text, GetText<&Server::internal_name>, SetText<&Server::internal_name>},
     {OCI_ATTR_EXTERNAL_NAME, Shape::text, GetText<&Server::external_name>, SetText<&Server::external_name>},
+    {OCI_ATTR_FOCBK, Shape::handle, nullptr, TakeFailover},
     {OCI_ATTR_SERVER_GROUP, Shape::text, GetText<&Server::group>, SetText<&Server::group>},
     {OCI_ATTR_SERVER_STATUS, Shape::ub4, Get<Server, GetStatus>, nullptr},
     {OCI_ATTR_SERVER_BUSY, Shape::ub1, Get<Server, GetBusy>, nullptr},

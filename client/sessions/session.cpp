@@ -36,6 +36,7 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_PURITY, Shape::ub4, GetField<&S::purity>, SetField<&S::purity>},
     {OCI_ATTR_MIGSESSION, Shape::handle, nullptr, TakeAny},
     {OCI_ATTR_PROXY_CREDENTIALS, Shape::handle, nullptr, TakeAny},
+    {OCI_ATTR_INITIAL_CLIENT_ROLES, Shape::handle, nullptr, TakeAny},
 };
 
 }  // namespace

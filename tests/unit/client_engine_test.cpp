@@ -325,6 +325,18 @@ TEST_F(EngineTest, ErrorsHaveTheirNumbers) {
     EXPECT_FALSE(connection_->InTransaction());
 }
 
+TEST_F(EngineTest, RefusedValueNamesItsColumn) {
+    ASSERT_EQ(Run("create table t(v varchar2(3))"), 0);
+    Rows rows{{Text("long")}};
+    for (const char* sql : {"insert into t values(?1)", "insert into t values('lo' || substr(?1, 3))"}) {
+        engine::ArrayOutcome outcome;
+        ASSERT_TRUE(Prepare(sql)->ExecuteArray(rows, 0, 1, false, outcome).Ok());
+        ASSERT_EQ(outcome.failures.size(), 1u) << sql;
+        EXPECT_EQ(outcome.failures[0].status.Number(), 12899);
+        EXPECT_EQ(outcome.failures[0].status.Detail(), "column V, actual 4, maximum 3") << sql;
+    }
+}
+
 TEST_F(EngineTest, SyntaxErrorTellsItsPlace) {
     std::unique_ptr<engine::Query> query;
     std::uint32_t offset = 0;
@@ -350,6 +362,19 @@ TEST_F(EngineTest, OpenQueryNeitherHindersNorSeesAnotherSessionsCommit) {
     EXPECT_EQ(Run("update t set n = n + 10"), 0);
     EXPECT_EQ(Rest(*open), "2;3;") << "the open query shows what it was opened on";
     ASSERT_TRUE(connection_->Rollback().Ok());
+}
+
+TEST_F(EngineTest, QueryIsDescribedAnewWhenItsTableHasChanged) {
+    ASSERT_EQ(Run("create table t(a integer)"), 0);
+    ASSERT_EQ(Run("insert into t values(1)"), 0);
+    const auto query = Prepare("select * from t");
+    Rows none{{}};
+    ASSERT_TRUE(query->Open(none, 0).Ok());
+    EXPECT_EQ(Rest(*query), "1;");
+    ASSERT_EQ(Run("alter table t add b char(3)"), 0);
+    ASSERT_EQ(Run("update t set b = 'x'"), 0);
+    ASSERT_TRUE(query->Open(none, 0).Ok());
+    EXPECT_EQ(Rest(*query), "1,x  ;");
 }
 
 TEST_F(EngineTest, OpenQueryOutlivesWritesDropsAndRollbackOfItsOwnSession) {
@@ -394,6 +419,15 @@ TEST_F(EngineTest, CancelStopsTheRunningCallOrTheNextOne) {
     EXPECT_EQ(Query("select 1"), "1;");
     connection_->Cancel();
     EXPECT_EQ(Query("select 1"), "error 1013");
+
+    const auto other = Open();
+    ASSERT_TRUE(other->Begin().Ok());
+    std::thread waiter([&] {
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+        connection_->Cancel();
+    });
+    EXPECT_EQ(connection_->Begin().Number(), 1013) << "while it waits for a lock";
+    waiter.join();
     connection_->Cancel();
     connection_->ForgetCancel();
     EXPECT_EQ(Query("select 1"), "1;");

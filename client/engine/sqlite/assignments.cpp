@@ -161,9 +161,13 @@ private:
 
     static std::string Stored(const std::string& expression, const TableColumn* target) {
         if (!target || !target->concerned) return expression;
-        std::string declared;
-        for (const char c : target->declared) declared.append(c == '\'' ? 2 : 1, c);
-        return "kelp_store(" + expression + ", '" + declared + "')";
+        return "kelp_store(" + expression + ", " + Literal(target->declared) + ", " + Literal(target->column.name) + ")";
+    }
+
+    static std::string Literal(std::string_view text) {
+        std::string literal = "'";
+        for (const char c : text) literal.append(c == '\'' ? 2 : 1, c);
+        return literal += '\'';
     }
 
     void Update() {
@@ -184,7 +188,7 @@ private:
         if (const std::size_t index = ParameterOf(span); index != kNowhere) {
             result_.parameters.push_back({index, target->column});
         } else if (!IsHarmless(span, *target)) {
-            const std::string wrapped = Stored(IsLongNumber(span) ? "''" : "", target);    // kelp_store('', 'type')
+            const std::string wrapped = Stored(IsLongNumber(span) ? "''" : "", target);    // kelp_store('', 'type', ...
             const std::size_t middle = wrapped.find(',') - (IsLongNumber(span) ? 1 : 0);
             wraps_.push_back({Begin(span.first), wrapped.substr(0, middle)});
             wraps_.push_back({End(span.last - 1), wrapped.substr(middle)});

@@ -1,5 +1,5 @@
 // Which columns a statement stores into: the declared types of the targets of its placeholders, and of its other
-// expressions, whose text is then wrapped into calls of kelp_store(expression, 'declared type').
+// expressions, whose text is then wrapped into calls of kelp_store(expression, 'declared type', 'column').
 #pragma once
 
 #include <sqlite3.h>

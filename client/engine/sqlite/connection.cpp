@@ -21,6 +21,7 @@ constexpr int kNotProperlyEnded = 933;
 constexpr int kNoStatement = 900;
 constexpr int kStatementTooLong = 1489;
 constexpr int kRolledBack = 2091;
+constexpr int kCancelled = 1013;
 constexpr std::size_t kLongestStatement = 1000000000;
 
 // Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
@@ -191,7 +192,10 @@ void SqliteConnection::OnChange(void* self, int, const char*, const char*, sqlit
 
 Status SqliteConnection::Run(const char* sql) {
     const int code = sqlite3_exec(database_.get(), sql, nullptr, nullptr, nullptr);
-    return code == SQLITE_OK ? Status() : Failure(database_.get(), code);
+    if (code == SQLITE_OK) return {};
+    if (!Cancelled()) return Failure(database_.get(), code);
+    ForgetCancel();    // it ended the wait for a lock
+    return Error(kCancelled).From("SQLITE");
 }
 
 std::string SqliteConnection::Text(const char* sql) {

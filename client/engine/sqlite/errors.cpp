@@ -99,15 +99,7 @@ int CountMismatch(std::string_view message) {
     return 0;
 }
 
-// Our own functions put the number at the end of their words.
-int NumberToldByFunction(std::string_view message) {
-    constexpr std::string_view kBefore = "value cannot be converted, error ";
-    if (!message.starts_with(kBefore)) return 0;
-    return std::atoi(std::string(message.substr(kBefore.size())).c_str());
-}
-
 int NumberOfWords(std::string_view message) {
-    if (const int told = NumberToldByFunction(message)) return told;
     for (const WordsRow& row : kWords) {
         if (message.starts_with(row.begin) && message.find(row.contains) != std::string_view::npos) return row.number;
     }
@@ -124,6 +116,12 @@ int NumberOf(int code, Verb verb, std::string_view message) {
     return (code & 0xFF) == SQLITE_ERROR ? NumberOfWords(message) : 600;
 }
 
+// "number detail", from a function of our own.
+Status ToldByFunction(std::string_view words) {
+    const std::size_t blank = words.find(' ');
+    return Error(std::atoi(std::string(words.substr(0, blank)).c_str()), std::string(words.substr(blank + 1))).From("SQLITE");
+}
+
 }  // namespace
 
 Status Failure(int code, std::string_view words) {
@@ -133,6 +131,7 @@ Status Failure(int code, std::string_view words) {
 Status Failure(sqlite3* database, int code, Verb verb) {
     const int extended = sqlite3_extended_errcode(database);
     const std::string_view words = sqlite3_errmsg(database);
+    if (words.starts_with(kErrorMark)) return ToldByFunction(words.substr(kErrorMark.size()));
     const int told = (extended & 0xFF) == (code & 0xFF) ? extended : code;
     return Error(NumberOf(told, verb, words), std::string(words)).From("SQLITE");
 }

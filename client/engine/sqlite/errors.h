@@ -10,6 +10,9 @@
 
 namespace engine::sqlite {
 
+// How the errors of this engine's own SQL functions begin; the number and the detail follow.
+inline constexpr std::string_view kErrorMark = "kelp error ";
+
 enum class Verb : std::uint8_t { other, insert, update, remove };    // what a statement does to rows
 
 // The status of a call that has just failed on the database.

@@ -18,11 +18,12 @@ namespace {
 
 using Arguments = sqlite3_value**;
 
-// A result that is an error: errors.cpp finds the number at the end of the words.
-void Refuse(sqlite3_context* context, int number) {
-    const std::string words = "value cannot be converted, error " + std::to_string(number);
+// A result that is an error: Failure reads number and detail back.
+void Refuse(sqlite3_context* context, const Status& status) {
+    const std::string words = std::string(kErrorMark) + std::to_string(status.Number()) + ' ' + status.Detail();
     sqlite3_result_error(context, words.c_str(), static_cast<int>(words.size()));
 }
+void Refuse(sqlite3_context* context, int number) { Refuse(context, Error(number)); }
 
 std::string_view Bytes(sqlite3_value* value) {
     const auto* bytes = static_cast<const char*>(sqlite3_value_blob(value));
@@ -107,7 +108,7 @@ void ToNumber(sqlite3_context* context, int count, Arguments arguments) {
     if (count > 2) column.scale = static_cast<std::int8_t>(std::clamp(sqlite3_value_int(arguments[2]), -84, 126));
     Coercion coercion(std::move(column));
     const Status status = coercion.Apply(value);
-    if (status.Failed()) Refuse(context, status.Number());
+    if (status.Failed()) Refuse(context, status);
     else ReturnDatum(context, value);
 }
 
@@ -198,20 +199,21 @@ void Now(sqlite3_context* context, int, Arguments) {
     ReturnDate(context, now);
 }
 
-// store(x, 'declared type'): what a column of that type takes, or refuses. The type is read once a statement.
+// store(x, 'declared type', 'column'): what a column of that type takes, or refuses. The type is read once a statement.
 void Store(sqlite3_context* context, int, Arguments arguments) {
     auto* coercion = static_cast<Coercion*>(sqlite3_get_auxdata(context, 1));
     std::unique_ptr<Coercion> made;
     if (!coercion) {
         Column column;
         if (!ReadDeclaredType(TextOf(arguments[1]), column)) return sqlite3_result_value(context, arguments[0]);
+        column.name = TextOf(arguments[2]);
         made = std::make_unique<Coercion>(std::move(column));
         coercion = made.get();
     }
     OCINumber number;
     Datum value = ReadDatum(arguments[0], number);
     const Status status = coercion->Apply(value);
-    if (status.Failed()) Refuse(context, status.Number());
+    if (status.Failed()) Refuse(context, status);
     else ReturnDatum(context, value);
     if (made) {
         sqlite3_set_auxdata(context, 1, made.release(), [](void* kept) { delete static_cast<Coercion*>(kept); });
@@ -233,7 +235,7 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_char", 1, 2, SQLITE_DETERMINISTIC, ToText<true>},
     {"kelp_date", 1, 1, SQLITE_DETERMINISTIC, ToDate<true>},
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
-    {"kelp_store", 2, 2, SQLITE_DETERMINISTIC, Store},
+    {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Store},
     {"kelp_sysdate", 0, 0, 0, Now<true>},
     {"kelp_systimestamp", 0, 0, 0, Now<false>},
 };

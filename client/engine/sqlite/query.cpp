@@ -31,8 +31,10 @@ void SqliteQuery::StoreInto(std::size_t parameter, const Column& column) {
 }
 
 const std::vector<Column>& SqliteQuery::Columns() {
-    const int count = sqlite3_column_count(statement_.get());
-    if (count > 0 && columns_.empty()) {
+    const auto count = static_cast<std::size_t>(sqlite3_column_count(statement_.get()));
+    if (columns_.size() != count) {    // not described yet, or its tables have changed
+        columns_.clear();
+        untyped_.clear();
         DescribeColumns(connection_.Database(), statement_.get(), sql_, columns_, untyped_);
         PlanReading();
     }
