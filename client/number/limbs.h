@@ -41,14 +41,11 @@ inline std::uint64_t EstimateQuotient(Wide value) {
 
 // value / kLimb for value < 2^108, with the rest in *rest.
 inline std::uint64_t DivideByLimb(Wide value, std::uint64_t* rest) {
-    std::uint64_t quotient = EstimateQuotient(value);
-    std::uint64_t remainder = static_cast<std::uint64_t>(value) - quotient * kLimb;
-    if (remainder >= kLimb) {
-        remainder -= kLimb;
-        ++quotient;
-    }
-    *rest = remainder;
-    return quotient;
+    const std::uint64_t quotient = EstimateQuotient(value);
+    const std::uint64_t remainder = static_cast<std::uint64_t>(value) - quotient * kLimb;
+    const std::uint64_t more = remainder >= kLimb;
+    *rest = remainder - (more ? kLimb : 0);
+    return quotient + more;
 }
 
 }  // namespace number

@@ -1,4 +1,4 @@
-// Multiplication and division on limbs of 16 digits, most significant first.
+// Multiplication on limbs of 16 digits, most significant first; division on binary words, limb by limb of the quotient.
 #include "number/digits.h"
 #include "number/limbs.h"
 #include "number/number.h"
@@ -50,84 +50,104 @@ void MultiplyMantissas(const std::uint64_t (&a)[3], const std::uint64_t (&b)[3],
     if (may_carry) product.Digits24(product.ExactCarry(), words);
 }
 
-// Schoolbook division: the divisor is scaled until its first limb is large, so that each estimate of a quotient limb from
-// leading limbs is at most two too large.
-class Divisor {
+// A mantissa as a binary number of three words, the least significant first.
+struct Binary {
+    std::uint64_t words[3];
+
+    explicit Binary(const std::uint64_t (&digits)[3]) {
+        constexpr std::uint64_t kHalfLimb = 100'000'000;
+        const Wide high = Wide{LimbOfWord(digits[0])} * kLimb + LimbOfWord(digits[1]);
+        const Wide low = Wide{static_cast<std::uint64_t>(high)} * kHalfLimb + LimbOfWord(digits[2]) / kHalfLimb;
+        const Wide rest = (high >> 64) * kHalfLimb + (low >> 64);
+        words[0] = static_cast<std::uint64_t>(low);
+        words[1] = static_cast<std::uint64_t>(rest);
+        words[2] = static_cast<std::uint64_t>(rest >> 64);
+    }
+};
+
+// Divides by a mantissa limb by limb. Divisor and rest are shifted until the divisor's first bit is set, and a reciprocal of
+// its first word gives each quotient limb at most two too large.
+class Divider {
 public:
-    explicit Divisor(const std::uint64_t (&words)[3])
-        : factor_(kLimb / (LimbOfWord(words[0]) + 1)) {
-        Scale(words, &limbs_);
+    Divider(const Binary& dividend, const Binary& divisor) {
+        const auto* v = divisor.words;
+        shift_ = v[2] != 0 ? std::countl_zero(v[2]) : 64 + std::countl_zero(v[1]);
+        Shift(divisor, &divisor_[0]);
+        Shift(dividend, &rest_[0]);
+        reciprocal_ = static_cast<std::uint64_t>((Wide{~divisor_[2]} << 64 | ~0ull) / divisor_[2]);
     }
 
-    // Scales the dividend the same way; one limb is set in front.
-    void Scale(const std::uint64_t (&words)[3], std::uint64_t (*limbs)[4]) const {
-        std::uint64_t carry = 0;
-        for (int i = 2; i >= 0; --i) carry = DivideByLimb(Wide{LimbOfWord(words[i])} * factor_ + carry, &(*limbs)[i + 1]);
-        (*limbs)[0] = carry;
-    }
-
-    // The quotient's next limb: divides four limbs and leaves the rest, shifted up by a limb.
-    std::uint64_t NextLimb(std::uint64_t (*rest)[4]) const {
-        std::uint64_t(&r)[4] = *rest;
-        const Wide top = Wide{r[0]} * kLimb + r[1];
-        Wide estimate = top / limbs_[1];
-        Wide left = top - estimate * limbs_[1];
-        while (estimate >= kLimb || estimate * limbs_[2] > left * kLimb + r[2]) {
-            --estimate;
-            left += limbs_[1];
-            if (left >= kLimb) break;
+    // The quotient of the rest, below 10^16; what is left is the rest from then on.
+    std::uint64_t Quotient() {
+        std::uint64_t quotient = Estimate(rest_[3], rest_[2]);
+        Wide product = 0, difference = 0;
+        std::uint64_t borrow = 0;
+        for (int i = 0; i < 3; ++i) {
+            product = Wide{quotient} * divisor_[i] + (product >> 64);
+            difference = Wide{rest_[i]} - static_cast<std::uint64_t>(product) - borrow;
+            rest_[i] = static_cast<std::uint64_t>(difference);
+            borrow = static_cast<std::uint64_t>(difference >> 64) & 1;
         }
-        auto quotient = static_cast<std::uint64_t>(estimate);
-        if (Subtract(quotient, rest)) {
-            --quotient;
-            AddBack(rest);
-        }
-        r[0] = r[1];
-        r[1] = r[2];
-        r[2] = r[3];
-        r[3] = 0;
+        rest_[3] -= static_cast<std::uint64_t>(product >> 64) + borrow;
+        for (; rest_[3] != 0; --quotient) AddBack();
         return quotient;
     }
 
+    std::uint64_t NextLimb() {
+        Wide product = 0;
+        for (int i = 0; i < 3; ++i) {
+            product = Wide{rest_[i]} * kLimb + (product >> 64);
+            rest_[i] = static_cast<std::uint64_t>(product);
+        }
+        rest_[3] = static_cast<std::uint64_t>(product >> 64);
+        return Quotient();
+    }
+
 private:
-    // rest -= quotient x divisor; answers whether that went below zero (the rest is then kept modulo kLimb^4).
-    bool Subtract(std::uint64_t quotient, std::uint64_t (*rest)[4]) const {
-        std::uint64_t carry = 0;
-        for (int i = 3; i >= 1; --i) {
-            std::uint64_t product;
-            carry = DivideByLimb(Wide{quotient} * limbs_[i] + carry, &product);
-            if ((*rest)[i] < product) {
-                (*rest)[i] += kLimb;
-                ++carry;
-            }
-            (*rest)[i] -= product;
-        }
-        const bool below = (*rest)[0] < carry;
-        (*rest)[0] = 0;
-        return below;
+    // At most three words are needed before the shift, four after it.
+    void Shift(const Binary& from, std::uint64_t* to) const {
+        const int bits = shift_ & 63;
+        const std::uint64_t* w = from.words;
+        const std::uint64_t shifted[4] = {w[0] << bits, w[1] << bits | w[0] >> 1 >> (63 - bits),
+                                          w[2] << bits | w[1] >> 1 >> (63 - bits), w[2] >> 1 >> (63 - bits)};
+        const int skipped = shift_ / 64;
+        to[0] = skipped ? 0 : shifted[0];
+        for (int i = 1; i < 4; ++i) to[i] = shifted[i - skipped];
     }
 
-    void AddBack(std::uint64_t (*rest)[4]) const {
-        std::uint64_t carry = 0;
-        for (int i = 3; i >= 1; --i) {
-            std::uint64_t sum = (*rest)[i] + limbs_[i] + carry;
-            carry = sum >= kLimb;
-            if (carry) sum -= kLimb;
-            (*rest)[i] = sum;
+    // (high, low) / first word of the divisor, by its reciprocal.
+    [[nodiscard]] std::uint64_t Estimate(std::uint64_t high, std::uint64_t low) const {
+        const std::uint64_t divisor = divisor_[2];
+        const Wide product = Wide{reciprocal_} * high + (Wide{high} << 64 | low);
+        std::uint64_t quotient = static_cast<std::uint64_t>(product >> 64) + 1;
+        std::uint64_t rest = low - quotient * divisor;
+        if (rest > static_cast<std::uint64_t>(product)) {
+            --quotient;
+            rest += divisor;
         }
+        return quotient + (rest >= divisor);
     }
 
-    std::uint64_t factor_;
-    std::uint64_t limbs_[4];  // the first is 0
+    void AddBack() {
+        Wide sum = 0;
+        for (int i = 0; i < 3; ++i) {
+            sum = Wide{rest_[i]} + divisor_[i] + (sum >> 64);
+            rest_[i] = static_cast<std::uint64_t>(sum);
+        }
+        rest_[3] += static_cast<std::uint64_t>(sum >> 64);
+    }
+
+    int shift_;
+    std::uint64_t reciprocal_;
+    std::uint64_t divisor_[4];  // the last is 0
+    std::uint64_t rest_[4];
 };
 
 // The first digits of a quotient; what the rest would add below the guard digits does not change a rounding half up.
 void DivideMantissas(const Digits& a, const Digits& b, Digits* quotient) {
-    const Divisor divisor(b.words);
-    std::uint64_t rest[4];
-    divisor.Scale(a.words, &rest);
-    const std::uint64_t whole = divisor.NextLimb(&rest);  // below 100
-    for (std::uint64_t& word : quotient->words) word = WordOfLimb(divisor.NextLimb(&rest));
+    Divider divider{Binary(a.words), Binary(b.words)};
+    const std::uint64_t whole = divider.Quotient();  // below 100
+    for (std::uint64_t& word : quotient->words) word = WordOfLimb(divider.NextLimb());
     quotient->exponent = a.exponent - b.exponent - 1;
     if (whole == 0) return;
     ShiftRight(quotient, 1);
@@ -149,7 +169,7 @@ Errno Mul(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
     MultiplyMantissas(a.words, b.words, product.words);
     product.exponent = a.exponent + b.exponent + 1;
     product.negative = a.negative != b.negative;
-    if (product.words[0] >> 56 == 0) Normalize(&product);
+    CloseGap(&product);
     return RoundAndPack(&product, result);
 }
 
