@@ -130,7 +130,12 @@ int Statement::StoreRow(ub4 index) {
     return worst;
 }
 
+// A scrollable cursor that delivered something stays on the last row of it.
 Status Statement::EndOfFetch() {
+    bool found = false;
+    if (cursor_.Scrollable() && rows_fetched_ > 0) {
+        if (Status status = cursor_.GoTo(cursor_.Position() - 1, found); !status.Ok()) return status;
+    }
     row_count_ = cursor_.Reached();
     state_ = State::end_of_fetch;
     return NoData();
