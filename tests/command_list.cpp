@@ -1,5 +1,6 @@
-// Prints the commands that have a handler, a line each: word, usage text, and the word counts it takes ("3 5 6"; "4+" for
-// any count from there on, "any" for a command that judges its counts itself). What tests need to know of the command table.
+// Prints the commands that have a handler, a line each: word, usage text, and the word counts it takes ("3 5 6"; "4+"
+// for any count from there on, "any" for a command that judges its counts itself). What tests need to know of the
+// command table.
 #include <cstdio>
 #include <string>
 

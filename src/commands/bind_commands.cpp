@@ -1,5 +1,5 @@
-// Binds and defines. No address is ever typed: value, indicator, length, return code and current element are those of the
-// buffer or the struct member that a word names.
+// Binds and defines. No address is ever typed: value, indicator, length, return code and current element are those of
+// the buffer or the struct member that a word names.
 #include "commands/families.h"
 #include "commands/handle_shapes.h"
 #include "commands/statement_modes.h"
@@ -15,7 +15,7 @@ template <class T> void EnterOnStatement(const NewObject<T>& object, Kind kind, 
     if (slot != nullptr) slot->owner = statement;
 }
 
-// --- Binds ------------------------------------------------------------------------------------------------------------
+// --- Binds -----------------------------------------------------------------------------------------------------------
 
 // What is bound: a name or a position. Of a struct, a position stands for one of its members, too.
 struct Placeholder {
@@ -105,8 +105,8 @@ void RunBind(const Bind& row, int count, char** words) {
 
 constexpr Bind kBinds[] = {
     {{323, Words(10, 11),
-      "OCIBindByName hStmt hBind hError placeholder placeholder_len {memhandle | memstructhandle elementindex} maxarr_len "
-      "curelep mode"},
+      "OCIBindByName hStmt hBind hError placeholder placeholder_len {memhandle | memstructhandle elementindex} "
+      "maxarr_len curelep mode"},
      ReadName, BindByName,
      {.data = 6, .member = 0, .most_elements = 7, .current = 8, .mode = 9},
      {.data = 6, .member = 7, .most_elements = 8, .current = 9, .mode = 10}},
@@ -116,7 +116,7 @@ constexpr Bind kBinds[] = {
      {.data = 5, .member = 0, .most_elements = 6, .current = 7, .mode = 8}},
 };
 
-// --- Defines ----------------------------------------------------------------------------------------------------------
+// --- Defines ---------------------------------------------------------------------------------------------------------
 
 constexpr int kDefineCode = 321;
 
@@ -144,7 +144,7 @@ constexpr PlainCommand kDefines[] = {
      DefineByPosition},
 };
 
-// --- Arrays of structs ------------------------------------------------------------------------------------------------
+// --- Arrays of structs -----------------------------------------------------------------------------------------------
 
 template <class Object> struct ArrayOfStruct : CommandRow {
     LibraryFunction<sword(Object*, OCIError*, ub4, ub4, ub4, ub4)> ClientLibrary::*function;

@@ -8,12 +8,12 @@
 
 namespace {
 
-// --- QuickConnectOCI --------------------------------------------------------------------------------------------------
+// --- QuickConnectOCI -------------------------------------------------------------------------------------------------
 
 OCIEnv* MakeEnvironment(const char* name) {
     OCIEnv* environment = nullptr;
-    const sword rc = Call(&ClientLibrary::OCIEnvCreate, &environment, ub4{OCI_OBJECT}, nullptr, nullptr, nullptr, nullptr,
-                          size_t{0}, nullptr);
+    const sword rc = Call(&ClientLibrary::OCIEnvCreate, &environment, ub4{OCI_OBJECT}, nullptr, nullptr, nullptr,
+                          nullptr, size_t{0}, nullptr);
     if (rc != OCI_SUCCESS) {
         Message(kError, "OCIEnvCreate failed\n");
         return nullptr;
@@ -45,8 +45,8 @@ void LogOn(OCIEnv* environment, OCIError* error, OCISvcCtx* svc, int count, char
         user.text = words[5];
         password.text = replace_password ? std::string_view(start_up_password) : words[6];
     }
-    const sword rc = Call(&ClientLibrary::OCILogon, environment, error, &svc, user.Text(), user.Length(), password.Text(),
-                          password.Length(), server.Text(), server.Length());
+    const sword rc = Call(&ClientLibrary::OCILogon, environment, error, &svc, user.Text(), user.Length(),
+                          password.Text(), password.Length(), server.Text(), server.Length());
     ReturnCodeReport(error, rc);
 }
 
@@ -65,7 +65,7 @@ void QuickConnect(int count, char** words) {
     LogOn(environment, static_cast<OCIError*>(error), static_cast<OCISvcCtx*>(svc), count, words);
 }
 
-// --- KillEnvOCI -------------------------------------------------------------------------------------------------------
+// --- KillEnvOCI ------------------------------------------------------------------------------------------------------
 
 // Frees a handle and its name. False when the library refuses, which is reported against the environment.
 bool FreeHandle(OCIEnv* environment, void* handle, ub4 type, Kind kind, const char* name) {

@@ -10,7 +10,7 @@ ub4 DecodeMode(const char* word) {
     return static_cast<ub4>(DecodeBitmaskOrNumber(word, EnvModeKeywords));
 }
 
-// --- Memory callbacks -------------------------------------------------------------------------------------------------
+// --- Memory callbacks ------------------------------------------------------------------------------------------------
 
 char my_context[] = "My  Context";
 
@@ -50,7 +50,7 @@ void* ContextOf(const char* word) {
     return IsNull(word) ? nullptr : my_context;
 }
 
-// --- Environments -----------------------------------------------------------------------------------------------------
+// --- Environments ----------------------------------------------------------------------------------------------------
 
 // The words after the mode: extramem and null, or the four of the callbacks and then those.
 constexpr int kFirstOption = 3;
@@ -103,7 +103,7 @@ constexpr EnvironmentMaker kEnvironmentMakers[] = {
      false},
 };
 
-// --- The process ------------------------------------------------------------------------------------------------------
+// --- The process -----------------------------------------------------------------------------------------------------
 
 constexpr int kInitializeCode = 202;
 constexpr int kTerminateCode = 212;

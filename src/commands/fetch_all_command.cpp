@@ -1,5 +1,6 @@
-// FetchAllOCI: a whole result set as a table. Every column is defined for a fetch in pieces, and every value is handed the
-// same buffer, piece by piece. The calls inside leave no trace lines. A row is one message; nothing is allocated for it.
+// FetchAllOCI: a whole result set as a table. Every column is defined for a fetch in pieces, and every value is handed
+// the same buffer, piece by piece. The calls inside leave no trace lines. A row is one message; nothing is allocated
+// for it.
 #include <algorithm>
 #include <cstring>
 #include <string>
@@ -77,7 +78,7 @@ bool Table::Check(sword rc, bool failed) {
     return false;
 }
 
-// --- Header -----------------------------------------------------------------------------------------------------------
+// --- Header ----------------------------------------------------------------------------------------------------------
 
 bool Table::Describe() {
     const sword rc = Call(&ClientLibrary::OCIAttrGet, statement_, ub4{OCI_HTYPE_STMT}, &columns_, nullptr,
@@ -134,7 +135,7 @@ void Table::PrintFooter() {
     Message(kOutput, "Number of rows fetched - %ld\n", rows_);
 }
 
-// --- Rows -------------------------------------------------------------------------------------------------------------
+// --- Rows ------------------------------------------------------------------------------------------------------------
 
 sword Table::Fetch() {
     return Call(&ClientLibrary::OCIStmtFetch, statement_, error_, ub4{1}, ub2{OCI_FETCH_NEXT}, ub4{OCI_DEFAULT});
@@ -144,8 +145,8 @@ sword Table::AskForPiece() {
     ub1 direction = 0;
     ub4 iteration = 0;
     ub4 index = 0;
-    return Call(&ClientLibrary::OCIStmtGetPieceInfo, statement_, error_, &define_, &define_type_, &direction, &iteration,
-                &index, &piece_);
+    return Call(&ClientLibrary::OCIStmtGetPieceInfo, statement_, error_, &define_, &define_type_, &direction,
+                &iteration, &index, &piece_);
 }
 
 bool Table::ReceivePiece() {

@@ -1,6 +1,6 @@
-// Allocating and freeing handles, descriptors and arrays of descriptors. Which table an object is entered in follows from
-// its numeric type; a type that has no table is passed to the library all the same, and nothing is entered. Return codes
-// are reported against the environment: the one named or, when freeing, the one the object was made from.
+// Allocating and freeing handles, descriptors and arrays of descriptors. Which table an object is entered in follows
+// from its numeric type; a type that has no table is passed to the library all the same, and nothing is entered. Return
+// codes are reported against the environment: the one named or, when freeing, the one the object was made from.
 #include <cstdint>
 #include <cstring>
 #include <optional>
@@ -38,7 +38,7 @@ constexpr TypeWord kNewDescriptorType = {HandleTypeKeywords, KindOfDescriptorTyp
 constexpr TypeWord kNewArrayType = {DescriptorTypeKeywords, KindOfDescriptorType, nullptr};
 constexpr TypeWord kDescriptorType = {DescriptorTypeKeywords, KindOfDescriptorType, "Invalid descriptor type - %s\n"};
 
-// --- One object -------------------------------------------------------------------------------------------------------
+// --- One object ------------------------------------------------------------------------------------------------------
 
 struct Allocation : CommandRow {
     LibraryFunction<sword(const void*, void**, ub4, size_t, void**)> ClientLibrary::*function;
@@ -70,7 +70,7 @@ constexpr Allocation kAllocations[] = {
      &ClientLibrary::OCIDescriptorAlloc, kNewDescriptorType},
 };
 
-// --- Arrays of descriptors --------------------------------------------------------------------------------------------
+// --- Arrays of descriptors -------------------------------------------------------------------------------------------
 
 constexpr int kArrayAllocCode = 409;
 
@@ -130,7 +130,7 @@ constexpr PlainCommand kArrayCommands[] = {
      AllocateArray},
 };
 
-// --- Freeing ----------------------------------------------------------------------------------------------------------
+// --- Freeing ---------------------------------------------------------------------------------------------------------
 
 template <class Object> struct Freeing : CommandRow {
     LibraryFunction<sword(Object*, ub4)> ClientLibrary::*function;
@@ -140,9 +140,9 @@ template <class Object> struct Freeing : CommandRow {
 // Frees the slot of that name and what it owned.
 void ReleaseObject(Kind kind, const char* name, NamedObject* slot) {
     if (kind == Kind::error && slot != nullptr) ForgetErrorHandle(slot->object);
-    void* const array = slot != nullptr && slot->array_count != 0 && slot == FindByName(kind, name) ? slot->object : nullptr;
+    const bool whole_array = slot != nullptr && slot->array_count != 0 && slot == FindByName(kind, name);
     Release(kind, name);
-    FreeMem(array);
+    if (whole_array) FreeMem(slot->object);
 }
 
 template <class Object> void Free(const Freeing<Object>& row, int, char** words) {

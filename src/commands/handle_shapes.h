@@ -1,5 +1,5 @@
-// What the commands on handles share: the words for a new object and for extra memory, the shape of a call on one handle,
-// and what follows a call.
+// What the commands on handles share: the words for a new object and for extra memory, the shape of a call on one
+// handle, and what follows a call.
 #pragma once
 
 #include <cstddef>
@@ -32,8 +32,8 @@ inline void* ResolveEither(Kind first, Kind second, const char* name) {
     return FindObject(first, name, object) ? object : ResolveObject(second, name);
 }
 
-// The object that a command makes: the name it shall have, and the place where the library puts it. "null" and "-1" give
-// the library no place.
+// The object that a command makes: the name it shall have, and the place where the library puts it. "null" and "-1"
+// give the library no place.
 template <class T> class NewObject {
 public:
     explicit NewObject(const char* name) : name_(name) {}
@@ -53,8 +53,8 @@ private:
     T* object_ = nullptr;
 };
 
-// The optional words "[extramem [null]]": memory of the script's own that comes with an object, and whether the library is
-// given a place for its address.
+// The optional words "[extramem [null]]": memory of the script's own that comes with an object, and whether the library
+// is given a place for its address.
 class ExtraMemory {
 public:
     ExtraMemory() = default;

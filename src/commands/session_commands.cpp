@@ -19,7 +19,7 @@ bool SetText(TextArgument& text, char** words) {
     return text.Set(words[0], DecodeLong(words[1]), TextArea::four_times);
 }
 
-// --- Calls on one handle ----------------------------------------------------------------------------------------------
+// --- Calls on one handle ---------------------------------------------------------------------------------------------
 
 // Where the library's own modes differ from those of environments, scripts give numbers.
 constexpr HandleCall kHandleCalls[] = {
@@ -53,7 +53,7 @@ constexpr HandleCall kHandleCalls[] = {
      [](void* handle, OCIError* error, char**) { return Call(&ClientLibrary::OCIReset, handle, error); }},
 };
 
-// --- Logging on -------------------------------------------------------------------------------------------------------
+// --- Logging on ------------------------------------------------------------------------------------------------------
 
 struct LogonTexts {
     TextArgument user, password, server;
@@ -101,7 +101,7 @@ constexpr Logon kLogons[] = {
      }},
 };
 
-// --- Calls with texts -------------------------------------------------------------------------------------------------
+// --- Calls with texts ------------------------------------------------------------------------------------------------
 
 constexpr int kServerAttachCode = 208;
 constexpr int kServerVersionCode = 218;
@@ -123,13 +123,13 @@ void ChangePassword(int, char** words) {
     auto* const error = ResolveError<OCIError>(words[2]);
     TextArgument user, old_password, new_password;
     if (!SetText(user, words + 3) || !SetText(old_password, words + 5) || !SetText(new_password, words + 7)) return;
-    const sword rc = Call(&ClientLibrary::OCIPasswordChange, svc, error, user.Text(), user.Length(), old_password.Text(),
-                          old_password.Length(), new_password.Text(), static_cast<sb4>(new_password.Length()),
-                          DecodeMode(words[9]));
+    const sword rc = Call(&ClientLibrary::OCIPasswordChange, svc, error, user.Text(), user.Length(),
+                          old_password.Text(), old_password.Length(), new_password.Text(),
+                          static_cast<sb4>(new_password.Length()), DecodeMode(words[9]));
     TraceAndReport(kPasswordChangeCode, words[1], error, rc);
 }
 
-// --- Versions ---------------------------------------------------------------------------------------------------------
+// --- Versions --------------------------------------------------------------------------------------------------------
 
 void* ResolveVersionHandle(int type, const char* type_word, const char* name) {
     switch (type) {

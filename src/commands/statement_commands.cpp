@@ -25,7 +25,7 @@ void RecordUtf16Mode(NamedObject* statement) {
     if (statement != nullptr) statement->utf16_mode = Utf16Mode ? OCI_UTF16 : 0;
 }
 
-// --- Preparing and executing ------------------------------------------------------------------------------------------
+// --- Preparing and executing -----------------------------------------------------------------------------------------
 
 void Prepare(int, char** words) {
     auto* const statement = Resolve<OCIStmt>(Kind::stmt, words[1]);
@@ -92,7 +92,7 @@ constexpr HandleCall kHandleCalls[] = {
      }},
 };
 
-// --- Fetching ---------------------------------------------------------------------------------------------------------
+// --- Fetching --------------------------------------------------------------------------------------------------------
 
 struct Fetch : CommandRow {
     sword (*fetch)(OCIStmt* statement, OCIError* error, ub4 rows, ub2 orientation, char** words);
@@ -131,7 +131,7 @@ constexpr Fetch kFetches[] = {
      }},
 };
 
-// --- Bind information -------------------------------------------------------------------------------------------------
+// --- Bind information ------------------------------------------------------------------------------------------------
 
 constexpr ub4 kMostBinds = 100;
 

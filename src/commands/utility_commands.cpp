@@ -1,5 +1,5 @@
-// Options, the client's INI file, removing a file, the locale, pausing. No command here calls the library. Most usage texts
-// end in a line feed of their own, so that an empty line follows them.
+// Options, the client's INI file, removing a file, the locale, pausing. No command here calls the library. Most usage
+// texts end in a line feed of their own, so that an empty line follows them.
 #include <clocale>
 #include <cstdio>
 #include <cstring>
@@ -18,7 +18,7 @@ bool BeginsWith(const char* word, const char* beginning) {
     return std::strncmp(word, beginning, std::strlen(beginning)) == 0;
 }
 
-// --- Options ----------------------------------------------------------------------------------------------------------
+// --- Options ---------------------------------------------------------------------------------------------------------
 
 // Options are only ever switched on, and whatever is not understood passes in silence.
 void SetOption(int count, char** words) {
@@ -26,7 +26,7 @@ void SetOption(int count, char** words) {
     if (count == 2 && BeginsWith(words[1], "PRINTSQLFUNCTIONCODE")) print_sql_function_code = true;
 }
 
-// --- The INI file -----------------------------------------------------------------------------------------------------
+// --- The INI file ----------------------------------------------------------------------------------------------------
 
 constexpr char kIniFile[] = "kelpcli.ini";
 constexpr char kIniSection[] = "kelpci";
@@ -64,7 +64,7 @@ void WriteIni(int count, char** words) {
     IniWriteString(kIniFile, kIniSection, words[1], count == 3 ? words[2] : nullptr);
 }
 
-// --- Surroundings -----------------------------------------------------------------------------------------------------
+// --- Surroundings ----------------------------------------------------------------------------------------------------
 
 // Said of a file that was not there, too.
 void DeleteFile(int, char** words) {
