@@ -1,6 +1,6 @@
-// What numbers cost, each beside the same work done another way in the same run: arithmetic beside GMP on values already in
-// its own form (whole numbers for sums, floats of 40 digits where results are rounded), functions beside MPFR at the
-// precision that 40 right digits need, and text and functions beside Python's decimal module at 40 digits.
+// What numbers cost, each beside the same work done another way in the same run: arithmetic beside GMP on values
+// already in its own form (whole numbers for sums, floats of 40 digits where results are rounded), functions beside
+// MPFR at the precision that 40 right digits need, and text and functions beside Python's decimal module at 40 digits.
 //   number_bench [runs]
 #include <gmp.h>
 #include <mpfr.h>
@@ -96,41 +96,55 @@ void BesideGmp(const Values& a, const Values& b) {
     const auto ours = [&](number::Binary function) {
         return [&, function](int i) { function(a.number[At(i)], b.number[Other(i)], &result); };
     };
-    const struct { const char* what; number::Binary ours; Whole theirs; } sums[] = {
-        {"add, 38 digits / mpz_add", number::Add, mpz_add}, {"subtract, 38 digits / mpz_sub", number::Sub, mpz_sub}};
+    const struct {
+        const char* what;
+        number::Binary ours;
+        Whole theirs;
+    } sums[] = {{"add, 38 digits / mpz_add", number::Add, mpz_add},
+                {"subtract, 38 digits / mpz_sub", number::Sub, mpz_sub}};
     for (const auto& row : sums)
         Pair(row.what, 2, kCount, ours(row.ours), [&](int i) { row.theirs(whole, a.whole[At(i)], b.whole[Other(i)]); });
-    const struct { const char* what; number::Binary ours; Floating theirs; } products[] = {
-        {"multiply, 38 digits / mpf_mul", number::Mul, mpf_mul}, {"divide, 38 digits / mpf_div", number::Div, mpf_div}};
+    const struct {
+        const char* what;
+        number::Binary ours;
+        Floating theirs;
+    } products[] = {{"multiply, 38 digits / mpf_mul", number::Mul, mpf_mul},
+                    {"divide, 38 digits / mpf_div", number::Div, mpf_div}};
     for (const auto& row : products)
         Pair(row.what, 3.5, kCount, ours(row.ours),
              [&](int i) { row.theirs(floating, a.floating[At(i)], b.floating[Other(i)]); });
-    Pair("square root, 38 digits / mpf_sqrt", 3.5, kCount, [&](int i) { number::Sqrt(a.number[At(i)], &result); },
-         [&](int i) { mpf_sqrt(floating, a.floating[At(i)]); });
+    Pair(
+        "square root, 38 digits / mpf_sqrt", 3.5, kCount, [&](int i) { number::Sqrt(a.number[At(i)], &result); },
+        [&](int i) { mpf_sqrt(floating, a.floating[At(i)]); });
     mpz_clear(whole);
     mpf_clear(floating);
 }
 
 void BesideMpfr(const Values& a) {
-    const struct { const char* what; number::Unary ours; Function theirs; } rows[] = {
-        {"sine / mpfr_sin at 160 bits", number::Sin, mpfr_sin},
-        {"exponential / mpfr_exp at 160 bits", number::Exp, mpfr_exp},
-        {"logarithm / mpfr_log at 160 bits", number::Ln, mpfr_log}};
+    const struct {
+        const char* what;
+        number::Unary ours;
+        Function theirs;
+    } rows[] = {{"sine / mpfr_sin at 160 bits", number::Sin, mpfr_sin},
+                {"exponential / mpfr_exp at 160 bits", number::Exp, mpfr_exp},
+                {"logarithm / mpfr_log at 160 bits", number::Ln, mpfr_log}};
     OCINumber result;
     mpfr_t real;
     mpfr_init2(real, kFunctionBits);
     for (const auto& row : rows)
-        Pair(row.what, 2, 5000, [&](int i) { row.ours(a.fraction[At(i)], &result); },
-             [&](int i) { row.theirs(real, a.real[At(i)], MPFR_RNDN); });
+        Pair(
+            row.what, 2, 5000, [&](int i) { row.ours(a.fraction[At(i)], &result); },
+            [&](int i) { row.theirs(real, a.real[At(i)], MPFR_RNDN); });
     mpfr_clear(real);
 }
 
 // The nanoseconds that Python's decimal takes for each statement, less what the timing loop itself takes. Its figures
 // cannot be taken in turn with ours: one interpreter runs for all of them.
 std::vector<double> PythonNanoseconds(const Values& a, const std::vector<std::string>& statements) {
-    std::string script = "import decimal,timeit\ndecimal.getcontext().prec=40\nD=decimal.Decimal\ns='" + a.text[0] +
-                         "'\nx=D(s)\ny=x.scaleb(-20)\nt=lambda w:min(timeit.repeat(w,globals=globals(),number=5000,repeat=7))\n"
-                         "e=t('pass')\n";
+    std::string script =
+        "import decimal,timeit\ndecimal.getcontext().prec=40\nD=decimal.Decimal\ns='" + a.text[0] +
+        "'\nx=D(s)\ny=x.scaleb(-20)\nt=lambda w:min(timeit.repeat(w,globals=globals(),number=5000,repeat=7))\n"
+        "e=t('pass')\n";
     for (const std::string& statement : statements) script += "print((t('" + statement + "')-e)/5000*1e9)\n";
     std::vector<double> figures;
     if (FILE* pipe = popen(("python3 -c \"" + script + "\"").c_str(), "r")) {
@@ -147,9 +161,16 @@ void BesidePython(const Values& a) {
     std::size_t length = 0;
     OCINumber parsed[kValues];
     for (int i = 0; i < kValues; ++i) number::FromPlainText(a.text[i], '.', &parsed[i]);
-    const struct { const char* what; const char* statement; double goal; double ours; } rows[] = {
-        {"square root / decimal", "x.sqrt()", 1, Nanoseconds(20000, [&](int i) { number::Sqrt(a.number[At(i)], &result); })},
-        {"exponential / decimal", "y.exp()", 1, Nanoseconds(5000, [&](int i) { number::Exp(a.fraction[At(i)], &result); })},
+    const struct {
+        const char* what;
+        const char* statement;
+        double goal;
+        double ours;
+    } rows[] = {
+        {"square root / decimal", "x.sqrt()", 1,
+         Nanoseconds(20000, [&](int i) { number::Sqrt(a.number[At(i)], &result); })},
+        {"exponential / decimal", "y.exp()", 1,
+         Nanoseconds(5000, [&](int i) { number::Exp(a.fraction[At(i)], &result); })},
         {"logarithm / decimal", "y.ln()", 1, Nanoseconds(5000, [&](int i) { number::Ln(a.fraction[At(i)], &result); })},
         {"number to text / decimal", "str(x)", 2,
          Nanoseconds(50000, [&](int i) { number::ToPlainText(parsed[At(i)], '.', text, &length); })},
@@ -163,8 +184,8 @@ void BesidePython(const Values& a) {
         return;
     }
     for (std::size_t i = 0; i < theirs.size(); ++i)
-        std::printf("%-52s %6.2f x  (goal %.1f)  %8.1f ns, %8.1f ns\n", rows[i].what, rows[i].ours / theirs[i], rows[i].goal,
-                    rows[i].ours, theirs[i]);
+        std::printf("%-52s %6.2f x  (goal %.1f)  %8.1f ns, %8.1f ns\n", rows[i].what, rows[i].ours / theirs[i],
+                    rows[i].goal, rows[i].ours, theirs[i]);
 }
 
 }  // namespace

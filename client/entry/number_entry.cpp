@@ -12,7 +12,7 @@ namespace {
 using number::Errno;
 
 constexpr int kMalformedText = 24501;
-constexpr ub4 kLargestBuffer = 0x7FFFFFFF;    // above, a size was negative
+constexpr ub4 kLargestBuffer = 0x7FFFFFFF;  // above, a size was negative
 
 // The record of a refused operation. Of malformed operands it names the first.
 Status Refused(Errno error, std::initializer_list<const OCINumber*> operands) {
@@ -56,7 +56,8 @@ sword Test(OCIError* err, const OCINumber* value, sword* result, number::Tested 
 
 bool IsIntegerLength(uword length) { return length == 1 || length == 2 || length == 4 || length == 8; }
 
-// An unusual length comes with a null pointer from callers that have no integer of that width: the length is told first.
+// An unusual length comes with a null pointer from callers that have no integer of that width: the length is told
+// first.
 Errno CheckInteger(uword length, uword sign, const void* integer, const OCINumber* value) {
     if (!IsIntegerLength(length)) return number::kBadIntegerLength;
     if (sign != OCI_NUMBER_UNSIGNED && sign != OCI_NUMBER_SIGNED) return number::kBadSignFlag;
@@ -71,8 +72,7 @@ Errno StoreReal(const OCINumber& value, void* out) {
     return 0;
 }
 
-template <class Real, Errno (*kConvert)(Real, OCINumber*) noexcept>
-Errno LoadReal(const void* in, OCINumber* result) {
+template <class Real, Errno (*kConvert)(Real, OCINumber*) noexcept> Errno LoadReal(const void* in, OCINumber* result) {
     Real real;
     std::memcpy(&real, in, sizeof real);
     return kConvert(real, result);

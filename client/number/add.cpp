@@ -67,8 +67,10 @@ template <bool kNegative>
         SubtractFrom(&a, b);
     }
     if (a.words[0] >> 56 == 0) return false;
-    if (below) Encode<!kNegative>(a, exponent ^ 0xFF, result);
-    else Encode<kNegative>(a, exponent, result);
+    if (below)
+        Encode<!kNegative>(a, exponent ^ 0xFF, result);
+    else
+        Encode<kNegative>(a, exponent, result);
     return true;
 }
 
@@ -88,7 +90,8 @@ Errno Add(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
 Errno Sub(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
     if (left.OCINumberPart[1] == right.OCINumberPart[1]) {
         const bool negative = left.OCINumberPart[1] < 128;
-        if (negative ? SubtractAligned<true>(left, right, result) : SubtractAligned<false>(left, right, result)) return 0;
+        if (negative ? SubtractAligned<true>(left, right, result) : SubtractAligned<false>(left, right, result))
+            return 0;
     }
     Digits a, b;
     if (const Errno error = Unpack(left, &a)) return error;

@@ -11,7 +11,7 @@ namespace number {
 
 namespace {
 
-constexpr int kMostPower = 200;  // from the last digit of the smallest number to the units, and some more
+constexpr int kMostPower = 200;          // from the last digit of the smallest number to the units, and some more
 constexpr mpfr_prec_t kDigitBits = 133;  // 100^20 < 2^133
 
 // 10^i, exact; made once and only read afterwards.
@@ -29,8 +29,10 @@ const Real& PowerOfTen(int i) {
 
 // *to = from * 10^power
 void Scale(const Real& from, int power, mpfr_rnd_t rounding, Real* to) {
-    if (power >= 0) mpfr_mul(*to, from, PowerOfTen(power), rounding);
-    else mpfr_div(*to, from, PowerOfTen(-power), rounding);
+    if (power >= 0)
+        mpfr_mul(*to, from, PowerOfTen(power), rounding);
+    else
+        mpfr_div(*to, from, PowerOfTen(-power), rounding);
 }
 
 class Integer {

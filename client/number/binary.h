@@ -42,8 +42,8 @@ constexpr mpfr_prec_t kFirstPrecision = 176;
 // A value that is this many bits close to a tie is one: no function of numbers of 40 digits comes nearer otherwise.
 constexpr mpfr_prec_t kLastPrecision = 2048;
 
-// Rounds a real to a number's digits. `good_bits` says how far it can be trusted: it is off by at most 1 in 2^good_bits of
-// itself. False when that leaves the rounding open; `tie` then decides for half up.
+// Rounds a real to a number's digits. `good_bits` says how far it can be trusted: it is off by at most 1 in 2^good_bits
+// of itself. False when that leaves the rounding open; `tie` then decides for half up.
 bool ToDigits(const Real& real, mpfr_prec_t good_bits, bool tie, Digits* digits);
 
 // Computes with more and more bits until the rounding is certain. compute(precision, Real*) -> good bits.

@@ -24,8 +24,8 @@ struct Decimal {
 // Of digits that come from a number.
 Decimal ToDecimal(const Digits& digits) noexcept;
 
-// Rounded to a number's digits and packed. Of a longer text than Decimal holds, the first digits are enough: what follows
-// does not change a rounding half up. Leading zeros are allowed.
+// Rounded to a number's digits and packed. Of a longer text than Decimal holds, the first digits are enough: what
+// follows does not change a rounding half up. Leading zeros are allowed.
 Errno FromDecimal(std::string_view digits, int point, bool negative, OCINumber* result) noexcept;
 
 inline bool IsDigit(char c) { return c >= '0' && c <= '9'; }
@@ -37,8 +37,10 @@ public:
         any_ = true;
         const bool significant = count_ > 0 || digit != '0';
         if (significant && count_ < sizeof kept_) kept_[count_++] = digit;
-        if (after_point) point_ -= !significant;
-        else point_ += significant;
+        if (after_point)
+            point_ -= !significant;
+        else
+            point_ += significant;
     }
     [[nodiscard]] bool Any() const { return any_; }
     // The number of the digits times 10^exponent.
@@ -86,8 +88,8 @@ void PutExponent(int exponent, Writer* out);
 // Reads E, sign and digits; where they are missing, leaves *exponent and the position alone.
 const char* ReadExponent(const char* at, const char* end, int* exponent);
 
-// Reads blanks, sign, digits with a point, exponent, blanks; false when the text is anything else. *error is kOverflow or
-// kUnderflow for a number out of range.
+// Reads blanks, sign, digits with a point, exponent, blanks; false when the text is anything else. *error is kOverflow
+// or kUnderflow for a number out of range.
 bool ReadPlain(std::string_view text, char decimal, OCINumber* result, Errno* error) noexcept;
 
 }  // namespace number

@@ -54,7 +54,8 @@ Wide Join(const Parts& parts, const Form& form) {
     const int sign = form.coefficient_bits + form.exponent_bits;
     const Wide exponent = static_cast<unsigned>(parts.exponent + form.bias);
     const Wide top = Wide{parts.negative} << sign;
-    if (parts.coefficient >> form.coefficient_bits == 0) return top | exponent << form.coefficient_bits | parts.coefficient;
+    if (parts.coefficient >> form.coefficient_bits == 0)
+        return top | exponent << form.coefficient_bits | parts.coefficient;
     const int low = form.coefficient_bits - 2;
     return top | Wide{3} << (sign - 2) | exponent << low | (parts.coefficient & ((Wide{1} << low) - 1));
 }
@@ -66,7 +67,8 @@ Wide LoadBits(const void* bytes, std::size_t size) {
     return bits;
 }
 void StoreBits(Wide bits, std::size_t size, void* bytes) {
-    for (std::size_t i = 0; i < size; ++i, bits >>= 8) static_cast<std::uint8_t*>(bytes)[i] = static_cast<std::uint8_t>(bits);
+    for (std::size_t i = 0; i < size; ++i, bits >>= 8)
+        static_cast<std::uint8_t*>(bytes)[i] = static_cast<std::uint8_t>(bits);
 }
 
 }  // namespace
@@ -77,7 +79,8 @@ Errno FromDecimalFloat(const void* bytes, std::size_t size, OCINumber* result) n
     if (parts.special) return parts.nan ? kBadNumber : kOverflow;
     char text[kMaxDigits];
     char* at = text + sizeof text;
-    for (Wide rest = parts.coefficient; rest != 0; rest /= 10) *--at = static_cast<char>('0' + static_cast<int>(rest % 10));
+    for (Wide rest = parts.coefficient; rest != 0; rest /= 10)
+        *--at = static_cast<char>('0' + static_cast<int>(rest % 10));
     const auto count = static_cast<std::size_t>(text + sizeof text - at);
     return FromDecimal({at, count}, parts.exponent + static_cast<int>(count), parts.negative, result);
 }
@@ -92,7 +95,8 @@ Errno ToDecimalFloat(const OCINumber& value, std::size_t size, void* bytes) noex
     Parts parts{};
     parts.negative = decimal.negative;
     parts.exponent = decimal.point - decimal.count;
-    for (const char digit : decimal.Text()) parts.coefficient = parts.coefficient * 10 + static_cast<unsigned>(digit - '0');
+    for (const char digit : decimal.Text())
+        parts.coefficient = parts.coefficient * 10 + static_cast<unsigned>(digit - '0');
     StoreBits(Join(parts, form), size, bytes);
     return 0;
 }

@@ -1,6 +1,6 @@
-// The unpacked form that arithmetic works on: 24 base-100 digits, one a byte, in three 64-bit words whose most significant
-// byte is the first digit. A number fills the first 20; the last four are guard digits. Whole words are added and
-// subtracted at once; a byte that passes 99 is mended by the 156 that separates base 100 from base 256.
+// The unpacked form that arithmetic works on: 24 base-100 digits, one a byte, in three 64-bit words whose most
+// significant byte is the first digit. A number fills the first 20; the last four are guard digits. Whole words are
+// added and subtracted at once; a byte that passes 99 is mended by the 156 that separates base 100 from base 256.
 #pragma once
 
 #include <algorithm>
@@ -14,15 +14,15 @@
 
 namespace number {
 
-constexpr int kMantissaDigits = 20;   // base-100 digits of a number
+constexpr int kMantissaDigits = 20;  // base-100 digits of a number
 constexpr int kUnpackedDigits = 24;
-constexpr int kMinExponent = -65;     // of the first digit, as a power of 100
+constexpr int kMinExponent = -65;  // of the first digit, as a power of 100
 constexpr int kMaxExponent = 62;
 constexpr int kZeroExponent = -1000;  // lets zero take part in additions as something very small
 
 struct Digits {
-    std::uint64_t words[3] = {};      // zero: all zero; else the first byte is not 0
-    int exponent = kZeroExponent;     // value = 0.words x 100^(exponent + 1)
+    std::uint64_t words[3] = {};   // zero: all zero; else the first byte is not 0
+    int exponent = kZeroExponent;  // value = 0.words x 100^(exponent + 1)
     bool negative = false;
 
     [[nodiscard]] bool IsZero() const { return words[0] == 0; }
@@ -102,8 +102,8 @@ template <class Word> void Store(std::uint8_t* bytes, Word word) {
 
 // *a += b and *a -= b over all digits, from a carry or borrow of 0 or 1 into the last; answer the one out of the first.
 // The words are added in binary, each digit of *a raised by 156 so that it carries as a digit does. A lane that did not
-// carry is then still raised, at least 156, while one that did is below 100: its high bit tells. A lane that borrowed got
-// 256 where it should have got 100, which its high bit tells as well.
+// carry is then still raised, at least 156, while one that did is below 100: its high bit tells. A lane that borrowed
+// got 256 where it should have got 100, which its high bit tells as well.
 inline std::uint64_t Lower(std::uint64_t word) { return word - ((word & detail::kHighBits) >> 7) * 156; }
 
 [[gnu::always_inline]] inline std::uint64_t AddInto(Digits* a, const Digits& b, std::uint64_t carry = 0) {
@@ -213,7 +213,8 @@ inline void CloseGap(Digits* digits) {
     digits->exponent -= static_cast<int>(gap);
 }
 
-// Cuts to the 20 digits of a number, half up; as often up as not, so without a branch but for a carry out of the last word.
+// Cuts to the 20 digits of a number, half up; as often up as not, so without a branch but for a carry out of the last
+// word.
 inline void RoundToMantissa(Digits* digits) {
     const std::uint64_t up = DigitAt(*digits, kMantissaDigits) >= 50;
     const std::uint64_t raised = (digits->words[2] & ~0xFFFFFFFFull) + detail::Repeat(156);
@@ -234,13 +235,14 @@ inline bool IsInfinite(const OCINumber& value) {
 namespace detail {
 // Zero, infinities, leading zeros, malformed bytes.
 Errno UnpackRare(const OCINumber& value, Digits* digits) noexcept;
-}
+}  // namespace detail
 
 inline bool HasMantissa(const OCINumber& value) { return value.OCINumberPart[0] - 2u < kMantissaDigits; }
 
 // Reads the mantissa of a number of that sign, which has 1 to 20 digits; answers 0, or not 0 for all that UnpackRare is
 // for. Written out word by word, and inlined so that the words stay in registers: this is half of an addition.
-template <bool kNegative> [[gnu::always_inline]] inline std::uint64_t Decode(const std::uint8_t* bytes, Digits* digits) {
+template <bool kNegative>
+[[gnu::always_inline]] inline std::uint64_t Decode(const std::uint8_t* bytes, Digits* digits) {
     using namespace detail;
     unsigned count = bytes[0] - 1u;
     if (kNegative) count -= bytes[1 + count] == kTerminator;
@@ -261,7 +263,8 @@ template <bool kNegative> [[gnu::always_inline]] inline std::uint64_t Decode(con
 }
 
 // Writes normalized digits, of which the last four are 0, as a number of that sign and exponent byte.
-template <bool kNegative> [[gnu::always_inline]] inline void Encode(const Digits& digits, unsigned exponent, OCINumber* result) {
+template <bool kNegative>
+[[gnu::always_inline]] inline void Encode(const Digits& digits, unsigned exponent, OCINumber* result) {
     using namespace detail;
     std::uint8_t* bytes = result->OCINumberPart;
     const unsigned count = CountDigits(digits);
@@ -292,8 +295,10 @@ inline Errno Pack(const Digits& digits, OCINumber* result) noexcept {
     }
     if (digits.exponent > kMaxExponent) return kOverflow;
     if (digits.exponent < kMinExponent) return kUnderflow;
-    if (digits.negative) Encode<true>(digits, static_cast<unsigned>(62 - digits.exponent), result);
-    else Encode<false>(digits, static_cast<unsigned>(193 + digits.exponent), result);
+    if (digits.negative)
+        Encode<true>(digits, static_cast<unsigned>(62 - digits.exponent), result);
+    else
+        Encode<false>(digits, static_cast<unsigned>(193 + digits.exponent), result);
     return 0;
 }
 

@@ -1,5 +1,5 @@
-// Numbers to and from text by a format model (9 0 . , D G $ L C U B S MI PR EEEE V TM X RN FM) and the NLS text that goes
-// with it. An empty model is the plain form. Models are ASCII; currency texts may be any UTF-8.
+// Numbers to and from text by a format model (9 0 . , D G $ L C U B S MI PR EEEE V TM X RN FM) and the NLS text that
+// goes with it. An empty model is the plain form. Models are ASCII; currency texts may be any UTF-8.
 #pragma once
 
 #include <cstddef>

@@ -15,18 +15,18 @@ struct FormatModel {
     Kind kind = Kind::fixed;
     Sign sign = Sign::before;
     Currency currency = Currency::none;
-    char currency_element = 0;      // '$', 'L', 'C' or 'U'
-    bool fill = true;               // false with FM: no blanks, no needless zeros
-    bool blank_zero = false;        // B
-    bool scientific = false;        // EEEE
-    bool lower_case = false;        // of RN and X
-    char point = 0;                 // '.', 'D', 'V', the element of a currency that stands for it, or 0
-    int places_before = 0;          // digit places
-    int places_after = 0;           // behind the point or the V
-    int zeros_before = 0;           // places before the point, or the end with V, that are always digits
-    int zeros_after = 0;            // places after it up to the last 0
+    char currency_element = 0;  // '$', 'L', 'C' or 'U'
+    bool fill = true;           // false with FM: no blanks, no needless zeros
+    bool blank_zero = false;    // B
+    bool scientific = false;    // EEEE
+    bool lower_case = false;    // of RN and X
+    char point = 0;             // '.', 'D', 'V', the element of a currency that stands for it, or 0
+    int places_before = 0;      // digit places
+    int places_after = 0;       // behind the point or the V
+    int zeros_before = 0;       // places before the point, or the end with V, that are always digits
+    int zeros_after = 0;        // places after it up to the last 0
     bool groups = false;
-    std::string_view whole;         // the elements before the point: 9, 0, comma and G count, others are passed over
+    std::string_view whole;  // the elements before the point: 9, 0, comma and G count, others are passed over
 };
 
 // kBadFormat for unknown or misplaced elements. The model keeps a view of the text.
@@ -36,8 +36,9 @@ struct RomanDigit {
     int value;
     std::string_view letters;
 };
-constexpr RomanDigit kRomanDigits[] = {{1000, "M"}, {900, "CM"}, {500, "D"}, {400, "CD"}, {100, "C"}, {90, "XC"}, {50, "L"},
-                                       {40, "XL"},  {10, "X"},   {9, "IX"},  {5, "V"},    {4, "IV"},  {1, "I"}};
+constexpr RomanDigit kRomanDigits[] = {{1000, "M"}, {900, "CM"}, {500, "D"}, {400, "CD"}, {100, "C"},
+                                       {90, "XC"},  {50, "L"},   {40, "XL"}, {10, "X"},   {9, "IX"},
+                                       {5, "V"},    {4, "IV"},   {1, "I"}};
 
 // The elements in the whole part that something is printed for.
 inline bool IsPlace(char element) { return element == '9' || element == '0'; }

@@ -47,7 +47,8 @@ private:
         return true;
     }
     void SkipBlanks() {
-        while (Take(' ')) {}
+        while (Take(' ')) {
+        }
     }
     bool TakeMoney() {
         switch (model_.currency_element) {
@@ -75,8 +76,10 @@ private:
             case FormatModel::Sign::brackets: return negative_ ? Take('>') : (SkipBlanks(), true);
             case FormatModel::Sign::trailing_s: TakeSign(); return true;
             case FormatModel::Sign::trailing_minus:
-                if (!Take('-')) SkipBlanks();
-                else negative_ = true;
+                if (!Take('-'))
+                    SkipBlanks();
+                else
+                    negative_ = true;
                 return true;
             default: return true;
         }
@@ -85,10 +88,12 @@ private:
     [[nodiscard]] bool IsGroupHere(std::size_t at) const {
         return model_.groups && (text_[at] == nls_.group || text_[at] == ',') && text_[at] != PointCharacter();
     }
-    [[nodiscard]] char PointCharacter() const { return model_.point == 'D' ? nls_.decimal : model_.point == '.' ? '.' : 0; }
+    [[nodiscard]] char PointCharacter() const {
+        return model_.point == 'D' ? nls_.decimal : model_.point == '.' ? '.' : 0;
+    }
 
-    // Digits before the point. The text is laid against the model from the right: groups may be left out, but stand where
-    // the model has them.
+    // Digits before the point. The text is laid against the model from the right: groups may be left out, but stand
+    // where the model has them.
     bool Whole() {
         const std::size_t start = at_;
         while (!AtEnd() && (IsDigit(text_[at_]) || IsGroupHere(at_))) ++at_;
@@ -156,7 +161,8 @@ Errno ReadRoman(std::string_view text, OCINumber* result) {
     text = WithoutLeadingBlanks(text);
     int value = 0;
     for (const RomanDigit& digit : kRomanDigits) {
-        const bool once = digit.letters.size() == 2 || digit.letters[0] == 'D' || digit.letters[0] == 'L' || digit.letters[0] == 'V';
+        const bool once =
+            digit.letters.size() == 2 || digit.letters[0] == 'D' || digit.letters[0] == 'L' || digit.letters[0] == 'V';
         for (int times = 0; times < (once ? 1 : 3); ++times) {
             if (text.size() < digit.letters.size()) break;
             if (Upper(text[0]) != digit.letters[0]) break;

@@ -1,5 +1,5 @@
-// Exponential, trigonometric and hyperbolic functions. Each is a row: how to compute it, which arguments it takes, and how
-// an error of the argument, which is rounded to binary, grows on the way to the result.
+// Exponential, trigonometric and hyperbolic functions. Each is a row: how to compute it, which arguments it takes, and
+// how an error of the argument, which is rounded to binary, grows on the way to the result.
 #include "number/binary.h"
 #include "number/digits.h"
 #include "number/number.h"
@@ -54,15 +54,17 @@ Errno Apply(const Function& function, const OCINumber& value, OCINumber* result)
     if (const Errno error = Unpack(value, &digits)) return error;
     if (function.to_one && IsBeyondOne(digits)) return kBadNumber;
     const Exponent extra = function.extra_bits(digits.IsZero() ? 0 : RoughExponent(digits) + 1);
-    return Evaluate([&](mpfr_prec_t precision, Real* real) {
-        Real argument(precision + extra);
-        ToReal(digits, &argument);
-        function.compute(*real, argument, MPFR_RNDN);
-        if (!argument.IsRegular() || !real->IsRegular()) return precision - 1;
-        // |error of argument| <= 2^(x - bits), times the slope, against 2^(y - 1).
-        const Exponent x = argument.Exponent(), y = real->Exponent();
-        return std::min<mpfr_prec_t>(precision + extra - x - function.slope(x, y) + y - 1, precision) - 1;
-    }, result);
+    return Evaluate(
+        [&](mpfr_prec_t precision, Real* real) {
+            Real argument(precision + extra);
+            ToReal(digits, &argument);
+            function.compute(*real, argument, MPFR_RNDN);
+            if (!argument.IsRegular() || !real->IsRegular()) return precision - 1;
+            // |error of argument| <= 2^(x - bits), times the slope, against 2^(y - 1).
+            const Exponent x = argument.Exponent(), y = real->Exponent();
+            return std::min<mpfr_prec_t>(precision + extra - x - function.slope(x, y) + y - 1, precision) - 1;
+        },
+        result);
 }
 
 }  // namespace
@@ -83,13 +85,15 @@ Errno ArcTan2(const OCINumber& y, const OCINumber& x, OCINumber* result) noexcep
     if (const Errno error = Unpack(y, &y_digits)) return error;
     if (const Errno error = Unpack(x, &x_digits)) return error;
     if (y_digits.IsZero() && x_digits.IsZero()) return kBadNumber;
-    return Evaluate([&](mpfr_prec_t precision, Real* real) {
-        Real y_real(precision + 2), x_real(precision + 2);
-        ToReal(y_digits, &y_real);
-        ToReal(x_digits, &x_real);
-        mpfr_atan2(*real, y_real, x_real, MPFR_RNDN);
-        return precision - 3;
-    }, result);
+    return Evaluate(
+        [&](mpfr_prec_t precision, Real* real) {
+            Real y_real(precision + 2), x_real(precision + 2);
+            ToReal(y_digits, &y_real);
+            ToReal(x_digits, &x_real);
+            mpfr_atan2(*real, y_real, x_real, MPFR_RNDN);
+            return precision - 3;
+        },
+        result);
 }
 
 }  // namespace number

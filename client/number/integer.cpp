@@ -49,8 +49,10 @@ template <class Integer> Errno ToBounded(const OCINumber& value, Integer* result
 template <class Integer> void ReadAs(const void* bytes, OCINumber* result) {
     Integer value;
     std::memcpy(&value, bytes, sizeof value);
-    if constexpr (std::numeric_limits<Integer>::is_signed) FromInt64(value, result);
-    else FromUint64(value, result);
+    if constexpr (std::numeric_limits<Integer>::is_signed)
+        FromInt64(value, result);
+    else
+        FromUint64(value, result);
 }
 
 template <class Integer> Errno WriteAs(const OCINumber& value, void* bytes) {
@@ -62,7 +64,7 @@ template <class Integer> Errno WriteAs(const OCINumber& value, void* bytes) {
 
 struct Width {
     std::size_t length;
-    void (*read[2])(const void*, OCINumber*);     // unsigned, signed
+    void (*read[2])(const void*, OCINumber*);  // unsigned, signed
     Errno (*write[2])(const OCINumber&, void*);
 };
 constexpr Width kWidths[] = {

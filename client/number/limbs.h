@@ -1,5 +1,5 @@
-// Limbs of 16 decimal digits, which multiplication and division work on: a word of eight base-100 digits and its limb hold
-// the same value.
+// Limbs of 16 decimal digits, which multiplication and division work on: a word of eight base-100 digits and its limb
+// hold the same value.
 #pragma once
 
 #include <cstdint>

@@ -42,7 +42,8 @@ struct Product {
     }
 };
 
-// The first digits of a product whose value is 0.words x 100^(exponent + 1): 22 right ones, which rounding needs, of 24.
+// The first digits of a product whose value is 0.words x 100^(exponent + 1): 22 right ones, which rounding needs,
+// of 24.
 void MultiplyMantissas(const std::uint64_t (&a)[3], const std::uint64_t (&b)[3], std::uint64_t (&words)[3]) {
     const Product product(a, b);
     product.Digits24(product.EstimatedCarry(), words);
@@ -65,8 +66,8 @@ struct Binary {
     }
 };
 
-// Divides by a mantissa limb by limb. Divisor and rest are shifted until the divisor's first bit is set, and a reciprocal of
-// its first word gives each quotient limb at most two too large.
+// Divides by a mantissa limb by limb. Divisor and rest are shifted until the divisor's first bit is set, and a
+// reciprocal of its first word gives each quotient limb at most two too large.
 class Divider {
 public:
     Divider(const Binary& dividend, const Binary& divisor) {

@@ -12,13 +12,12 @@ constexpr struct {
     std::string_view territory;
     std::string_view currency;
 } kTerritories[] = {
-    {"AMERICA", "USD"},     {"AUSTRALIA", "AUD"}, {"AUSTRIA", "EUR"},     {"BELGIUM", "EUR"},
-    {"BRAZIL", "BRL"},      {"CANADA", "CAD"},    {"CHINA", "CNY"},       {"DENMARK", "DKK"},
-    {"FINLAND", "EUR"},     {"FRANCE", "EUR"},    {"GERMANY", "EUR"},     {"GREECE", "EUR"},
-    {"INDIA", "INR"},       {"IRELAND", "EUR"},   {"ITALY", "EUR"},       {"JAPAN", "JPY"},
-    {"KOREA", "KRW"},       {"MEXICO", "MXN"},    {"NORWAY", "NOK"},      {"POLAND", "PLN"},
-    {"PORTUGAL", "EUR"},    {"RUSSIA", "RUB"},    {"SPAIN", "EUR"},       {"SWEDEN", "SEK"},
-    {"SWITZERLAND", "CHF"}, {"TURKEY", "TRY"},    {"UNITED KINGDOM", "GBP"},
+    {"AMERICA", "USD"},  {"AUSTRALIA", "AUD"},      {"AUSTRIA", "EUR"}, {"BELGIUM", "EUR"}, {"BRAZIL", "BRL"},
+    {"CANADA", "CAD"},   {"CHINA", "CNY"},          {"DENMARK", "DKK"}, {"FINLAND", "EUR"}, {"FRANCE", "EUR"},
+    {"GERMANY", "EUR"},  {"GREECE", "EUR"},         {"INDIA", "INR"},   {"IRELAND", "EUR"}, {"ITALY", "EUR"},
+    {"JAPAN", "JPY"},    {"KOREA", "KRW"},          {"MEXICO", "MXN"},  {"NORWAY", "NOK"},  {"POLAND", "PLN"},
+    {"PORTUGAL", "EUR"}, {"RUSSIA", "RUB"},         {"SPAIN", "EUR"},   {"SWEDEN", "SEK"},  {"SWITZERLAND", "CHF"},
+    {"TURKEY", "TRY"},   {"UNITED KINGDOM", "GBP"},
 };
 
 char Upper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; }
@@ -49,7 +48,8 @@ bool TakeValue(std::string_view* text, std::string_view* value) {
 
 bool SetNumericCharacters(std::string_view value, Nls* nls) {
     constexpr std::string_view kTaken = "+-<>0123456789";
-    if (value.size() != 2 || value[0] == value[1] || value.find_first_of(kTaken) != std::string_view::npos) return false;
+    if (value.size() != 2 || value[0] == value[1] || value.find_first_of(kTaken) != std::string_view::npos)
+        return false;
     if (static_cast<unsigned char>(value[0]) >= 128 || static_cast<unsigned char>(value[1]) >= 128) return false;
     nls->decimal = value[0];
     nls->group = value[1];
@@ -85,7 +85,8 @@ bool Set(std::string_view name, std::string_view value, Nls* nls) {
 Errno ParseNls(std::string_view text, Nls* nls) noexcept {
     for (text = TakeBlanks(text); !text.empty(); text = TakeBlanks(text)) {
         std::size_t length = 0;
-        while (length < text.size() && (Upper(text[length]) == '_' || (Upper(text[length]) >= 'A' && Upper(text[length]) <= 'Z')))
+        while (length < text.size() &&
+               (Upper(text[length]) == '_' || (Upper(text[length]) >= 'A' && Upper(text[length]) <= 'Z')))
             ++length;
         const std::string_view name = text.substr(0, length);
         text = TakeBlanks(text.substr(length));

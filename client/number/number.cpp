@@ -106,8 +106,10 @@ Errno Compare(const OCINumber& left, const OCINumber& right, int* result) noexce
 Errno Sign(const OCINumber& value, int* result) noexcept {
     Digits digits;
     if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
-    if (IsInfinite(value)) *result = IsNegativeInfinity(value) ? -1 : 1;
-    else *result = digits.IsZero() ? 0 : digits.negative ? -1 : 1;
+    if (IsInfinite(value))
+        *result = IsNegativeInfinity(value) ? -1 : 1;
+    else
+        *result = digits.IsZero() ? 0 : digits.negative ? -1 : 1;
     return 0;
 }
 

@@ -1,10 +1,10 @@
 // Decimal numbers in their 22-byte form: arithmetic, functions, and conversions from and to integers, reals and plain
 // text. Text by a format model is in number/format.h.
 //
-// A number holds at most 20 digits of base 100, so 39 or 40 decimal digits. Every result is the exact value rounded once
-// to that many digits, half away from zero. Every function checks its operands first, answers 0 or a published error
-// number and writes its result on success only; the result may be one of the operands. Nothing here throws, locks or
-// keeps state that another thread can see.
+// A number holds at most 20 digits of base 100, so 39 or 40 decimal digits. Every result is the exact value rounded
+// once to that many digits, half away from zero. Every function checks its operands first, answers 0 or a published
+// error number and writes its result on success only; the result may be one of the operands. Nothing here throws, locks
+// or keeps state that another thread can see.
 #pragma once
 
 #include <cstddef>
@@ -17,22 +17,22 @@ namespace number {
 
 using Errno = int;  // a published error number; 0: success
 
-constexpr Errno kInvalidNumber = 1722;      // plain text that is no number
-constexpr Errno kNumericOverflow = 1426;    // plain text of a number out of range
-constexpr Errno kBadArgument = 21560;       // an argument is null or out of range
-constexpr Errno kOverflow = 22053;          // 1E126 and above; also arithmetic with an infinity
-constexpr Errno kUnderflow = 22054;         // not zero, but below 1E-130
+constexpr Errno kInvalidNumber = 1722;    // plain text that is no number
+constexpr Errno kNumericOverflow = 1426;  // plain text of a number out of range
+constexpr Errno kBadArgument = 21560;     // an argument is null or out of range
+constexpr Errno kOverflow = 22053;        // 1E126 and above; also arithmetic with an infinity
+constexpr Errno kUnderflow = 22054;       // not zero, but below 1E-130
 constexpr Errno kBadSignFlag = 22055;
 constexpr Errno kDividedByZero = 22056;
 constexpr Errno kBadIntegerLength = 22057;
 constexpr Errno kBufferTooSmall = 22059;
-constexpr Errno kBadNumber = 22060;         // malformed, or outside the domain of the function
+constexpr Errno kBadNumber = 22060;  // malformed, or outside the domain of the function
 constexpr Errno kBadFormat = 22061;
-constexpr Errno kBadText = 22062;           // does not fit the format
+constexpr Errno kBadText = 22062;  // does not fit the format
 constexpr Errno kBadNls = 22064;
 constexpr Errno kRoundingOverflow = 22065;  // fits the format before rounding only
 
-constexpr int kMaxDigits = 40;              // decimal digits of a number, at most
+constexpr int kMaxDigits = 40;  // decimal digits of a number, at most
 
 // Shapes of functions, for tables of them.
 using Unary = Errno (*)(const OCINumber& value, OCINumber* result) noexcept;
@@ -67,7 +67,7 @@ Errno Mod(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
 
 Errno Round(const OCINumber& value, int places, OCINumber* result) noexcept;  // digits after the point, or -before it
 Errno Trunc(const OCINumber& value, int places, OCINumber* result) noexcept;
-Errno Prec(const OCINumber& value, int digits, OCINumber* result) noexcept;   // to so many significant digits, 1 or more
+Errno Prec(const OCINumber& value, int digits, OCINumber* result) noexcept;  // to so many significant digits, 1 or more
 Errno Shift(const OCINumber& value, int digits, OCINumber* result) noexcept;  // times 10 to the power of `digits`
 
 Errno Sqrt(const OCINumber& value, OCINumber* result) noexcept;
@@ -97,8 +97,8 @@ Errno ToUint64(const OCINumber& value, std::uint64_t* result) noexcept;
 Errno FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept;
 Errno ToInteger(const OCINumber& value, std::size_t length, bool is_signed, void* result) noexcept;
 
-// Reals. From: the shortest decimal that reads back as the same real; an infinity is kOverflow, a NaN kBadNumber. To: the
-// nearest real, ties to even; infinities stay so. What becomes zero or infinite only by its size is an error.
+// Reals. From: the shortest decimal that reads back as the same real; an infinity is kOverflow, a NaN kBadNumber. To:
+// the nearest real, ties to even; infinities stay so. What becomes zero or infinite only by its size is an error.
 Errno FromFloat(float value, OCINumber* result) noexcept;
 Errno FromDouble(double value, OCINumber* result) noexcept;
 Errno FromLongDouble(long double value, OCINumber* result) noexcept;
@@ -111,8 +111,8 @@ Errno ToLongDouble(const OCINumber& value, long double* result) noexcept;
 constexpr std::size_t kMaxPlainText = 48;
 // Writes at most kMaxPlainText characters, no terminator.
 Errno ToPlainText(const OCINumber& value, char decimal, char* text, std::size_t* length) noexcept;
-// Reads blanks, sign, digits with a point, exponent, blanks. kInvalidNumber for anything else, kNumericOverflow when too
-// large; what is too small to hold is 0.
+// Reads blanks, sign, digits with a point, exponent, blanks. kInvalidNumber for anything else, kNumericOverflow when
+// too large; what is too small to hold is 0.
 Errno FromPlainText(std::string_view text, char decimal, OCINumber* result) noexcept;
 
 }  // namespace number

@@ -5,14 +5,12 @@ namespace number {
 
 namespace {
 
-constexpr int kMostPlaces = 40;       // of the fixed form
+constexpr int kMostPlaces = 40;  // of the fixed form
 constexpr int kHugeExponent = 10'000'000;
 
 }  // namespace
 
-int FixedPlaces(const Decimal& value) {
-    return std::max(value.point, value.count) - std::min(value.point, 0);
-}
+int FixedPlaces(const Decimal& value) { return std::max(value.point, value.count) - std::min(value.point, 0); }
 
 void PutFixed(const Decimal& value, char decimal, Writer* out) {
     if (value.count == 0) {
@@ -120,8 +118,10 @@ Errno ToPlainText(const OCINumber& value, char decimal, char* text, std::size_t*
     } else {
         const Decimal number = ToDecimal(digits);
         if (number.negative) out.Put('-');
-        if (FixedPlaces(number) > kMostPlaces) PutScientific(number, decimal, &out);
-        else PutFixed(number, decimal, &out);
+        if (FixedPlaces(number) > kMostPlaces)
+            PutScientific(number, decimal, &out);
+        else
+            PutFixed(number, decimal, &out);
     }
     *length = out.Length();
     return 0;

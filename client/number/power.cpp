@@ -15,7 +15,8 @@ void NaturalLogarithm(const OCINumber& value, const Digits& digits, Real* real) 
     Real argument(real->Bits() + 2);
     OCINumber difference, one;
     Digits difference_digits;
-    const bool near_one = digits.exponent == 0 ? DigitAt(digits, 0) == 1 : digits.exponent == -1 && DigitAt(digits, 0) >= 50;
+    const bool near_one =
+        digits.exponent == 0 ? DigitAt(digits, 0) == 1 : digits.exponent == -1 && DigitAt(digits, 0) >= 50;
     FromInt64(1, &one);
     if (near_one && Sub(value, one, &difference) == 0 && Unpack(difference, &difference_digits) == 0) {
         ToReal(difference_digits, &argument);
@@ -40,17 +41,19 @@ bool IsOdd(const Digits& digits) {
 Errno Raise(Digits base, const Digits& exponent, OCINumber* result) {
     const bool negative = base.negative && IsOdd(exponent);
     base.negative = false;
-    // A relative error of the base counts as often as the exponent says; one of the exponent by the size of the result's
-    // logarithm, which is below 2^9 where the result is a number.
+    // A relative error of the base counts as often as the exponent says; one of the exponent by the size of the
+    // result's logarithm, which is below 2^9 where the result is a number.
     const mpfr_exp_t extra = std::max<mpfr_exp_t>(RoughExponent(exponent) + 1, 0) + 2;
-    return Evaluate([&](mpfr_prec_t precision, Real* real) {
-        Real base_real(precision + extra), exponent_real(precision + 12);
-        ToReal(base, &base_real);
-        ToReal(exponent, &exponent_real);
-        mpfr_pow(*real, base_real, exponent_real, MPFR_RNDN);
-        if (negative) mpfr_neg(*real, *real, MPFR_RNDN);
-        return precision - kGuardBits;
-    }, result);
+    return Evaluate(
+        [&](mpfr_prec_t precision, Real* real) {
+            Real base_real(precision + extra), exponent_real(precision + 12);
+            ToReal(base, &base_real);
+            ToReal(exponent, &exponent_real);
+            mpfr_pow(*real, base_real, exponent_real, MPFR_RNDN);
+            if (negative) mpfr_neg(*real, *real, MPFR_RNDN);
+            return precision - kGuardBits;
+        },
+        result);
 }
 
 Errno PowerOf(const Digits& base, const Digits& exponent, bool whole_exponent, OCINumber* result) {
@@ -72,24 +75,30 @@ Errno PowerOf(const Digits& base, const Digits& exponent, bool whole_exponent, O
 Errno Ln(const OCINumber& value, OCINumber* result) noexcept {
     Digits digits;
     if (const Errno error = UnpackPositive(value, &digits)) return error;
-    return Evaluate([&](mpfr_prec_t precision, Real* real) {
-        NaturalLogarithm(value, digits, real);
-        return precision - kGuardBits;
-    }, result);
+    return Evaluate(
+        [&](mpfr_prec_t precision, Real* real) {
+            NaturalLogarithm(value, digits, real);
+            return precision - kGuardBits;
+        },
+        result);
 }
 
 Errno Log(const OCINumber& base, const OCINumber& value, OCINumber* result) noexcept {
     Digits base_digits, value_digits;
     if (const Errno error = UnpackPositive(base, &base_digits)) return error;
     if (const Errno error = UnpackPositive(value, &value_digits)) return error;
-    return Evaluate([&](mpfr_prec_t precision, Real* real) {
-        Real base_logarithm(precision + kGuardBits), value_logarithm(precision + kGuardBits);
-        NaturalLogarithm(base, base_digits, &base_logarithm);
-        NaturalLogarithm(value, value_digits, &value_logarithm);
-        if (base_logarithm.IsZero()) mpfr_set_nan(*real);  // there is no base 1
-        else mpfr_div(*real, value_logarithm, base_logarithm, MPFR_RNDN);
-        return precision - kGuardBits;
-    }, result);
+    return Evaluate(
+        [&](mpfr_prec_t precision, Real* real) {
+            Real base_logarithm(precision + kGuardBits), value_logarithm(precision + kGuardBits);
+            NaturalLogarithm(base, base_digits, &base_logarithm);
+            NaturalLogarithm(value, value_digits, &value_logarithm);
+            if (base_logarithm.IsZero())
+                mpfr_set_nan(*real);  // there is no base 1
+            else
+                mpfr_div(*real, value_logarithm, base_logarithm, MPFR_RNDN);
+            return precision - kGuardBits;
+        },
+        result);
 }
 
 Errno IntPower(const OCINumber& base, int exponent, OCINumber* result) noexcept {

@@ -1,5 +1,5 @@
-// Conversions from and to the reals of the machine. Both ways go through decimal text, where the standard library rounds
-// correctly; nothing here depends on the locale, since no text holds a point.
+// Conversions from and to the reals of the machine. Both ways go through decimal text, where the standard library
+// rounds correctly; nothing here depends on the locale, since no text holds a point.
 #include <charconv>
 #include <cmath>
 #include <cstdlib>
@@ -39,7 +39,8 @@ template <class Real> Errno ToReal(const OCINumber& value, Real* result) {
     Digits digits;
     if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
     if (IsInfinite(value)) {
-        *result = value.OCINumberPart[1] == 0 ? -std::numeric_limits<Real>::infinity() : std::numeric_limits<Real>::infinity();
+        *result = value.OCINumberPart[1] == 0 ? -std::numeric_limits<Real>::infinity()
+                                              : std::numeric_limits<Real>::infinity();
         return 0;
     }
     if (digits.IsZero()) {

@@ -19,7 +19,8 @@ void SetDigit(Digits* digits, int index, int value) {
     word = (word & ~(0xFFull << shift)) | static_cast<std::uint64_t>(value) << shift;
 }
 
-// The decimal digits that a number has before its point, if its mantissa began with two: 2 for 1 to 99, 0 for 0.01 to 0.99.
+// The decimal digits that a number has before its point, if its mantissa began with two: 2 for 1 to 99, 0 for 0.01 to
+// 0.99.
 int PlacesBeforePoint(const Digits& digits) { return 2 * (digits.exponent + 1); }
 
 // Adds a unit of the decimal digit at `place`, counted from the start of the mantissa.
@@ -44,8 +45,8 @@ void IncrementDecimal(Digits* digits, int place) {
     ++digits->exponent;
 }
 
-// Keeps `kept` decimal digits from the start of the mantissa, whose first may be 0, and drops the others toward `toward`.
-// A `kept` of 0 or less leaves nothing or one unit of the place.
+// Keeps `kept` decimal digits from the start of the mantissa, whose first may be 0, and drops the others toward
+// `toward`. A `kept` of 0 or less leaves nothing or one unit of the place.
 void KeepDecimals(Digits* digits, int kept, Toward toward) {
     if (digits->IsZero() || kept >= 2 * kMantissaDigits) return;
     const int room = kept < 1 ? 1 - kept / 2 : 0;  // zeros in front, so that there is a place to keep
@@ -61,7 +62,8 @@ void KeepDecimals(Digits* digits, int kept, Toward toward) {
     const bool up = toward == Toward::nearest ? dropped >= 5
                                               : toward != Toward::zero && (toward == Toward::below) == digits->negative;
     if (splits) SetDigit(digits, index, last - dropped);
-    for (int word = 0; word < 3; ++word) digits->words[word] &= detail::kDecoding.rows[0][index + splits].mask.words[word];
+    for (int word = 0; word < 3; ++word)
+        digits->words[word] &= detail::kDecoding.rows[0][index + splits].mask.words[word];
     if (up) IncrementDecimal(digits, kept - 1);
     Normalize(digits);
 }
@@ -79,8 +81,10 @@ Errno Count(const OCINumber& value, bool up, OCINumber* result) {
     if (const Errno error = Unpack(value, &digits)) return error;
     OCINumber counted, one;
     FromInt64(1, &one);
-    if (!digits.negative && digits.exponent >= kMantissaDigits + 1) SetZero(&counted);
-    else counted = value;
+    if (!digits.negative && digits.exponent >= kMantissaDigits + 1)
+        SetZero(&counted);
+    else
+        counted = value;
     return up ? Add(counted, one, result) : Sub(counted, one, result);
 }
 

@@ -1,5 +1,5 @@
-// Numbers to text by a model. A text is put together twice: once to know its length, then behind the blanks that fill it
-// up to the width of the model.
+// Numbers to text by a model. A text is put together twice: once to know its length, then behind the blanks that fill
+// it up to the width of the model.
 #include "number/decimal.h"
 #include "number/format.h"
 #include "number/format_model.h"
@@ -36,9 +36,12 @@ std::string_view Money(const Job& job) {
 }
 
 void PutPoint(const Job& job, Writer* out) {
-    if (job.model.point == '.') out->Put('.');
-    else if (job.model.point == 'D') out->Put(job.nls.decimal);
-    else if (job.model.currency == FormatModel::Currency::point) out->Put(Money(job));
+    if (job.model.point == '.')
+        out->Put('.');
+    else if (job.model.point == 'D')
+        out->Put(job.nls.decimal);
+    else if (job.model.currency == FormatModel::Currency::point)
+        out->Put(Money(job));
 }
 
 void PutSignBefore(const Job& job, Writer* out) {
@@ -89,8 +92,10 @@ void PutWhole(const Job& job, Writer* out) {
     };
     const bool units_zero = PlacesShown(job) == 0 || model.point == 'V';
     for (const char element : model.whole) {
-        if (IsPlace(element)) put_place(units_zero);
-        else if (IsGroup(element) && started) out->Put(element == ',' ? ',' : job.nls.group);
+        if (IsPlace(element))
+            put_place(units_zero);
+        else if (IsGroup(element) && started)
+            out->Put(element == ',' ? ',' : job.nls.group);
     }
     while (place > 0) put_place(true);
 }
@@ -107,8 +112,9 @@ void PutScientificBody(const Job& job, Writer* out) {
     const int top = job.IsZero() ? 0 : job.decimal.point - 1;
     out->Put(job.Digit(top));
     PutPoint(job, out);
-    const int shown = job.model.fill ? job.model.places_after
-                                     : std::max(job.model.zeros_after, std::min(job.decimal.count - 1, job.model.places_after));
+    const int shown = job.model.fill
+                          ? job.model.places_after
+                          : std::max(job.model.zeros_after, std::min(job.decimal.count - 1, job.model.places_after));
     for (int place = 1; place <= shown; ++place) out->Put(job.Digit(top - place));
     PutExponent(top, out);
 }
@@ -117,8 +123,10 @@ void PutNumber(const Job& job, Writer* out) {
     if (job.model.blank_zero && job.IsZero()) return;
     PutSignBefore(job, out);
     if (job.model.currency == FormatModel::Currency::leading) out->Put(Money(job));
-    if (job.model.scientific) PutScientificBody(job, out);
-    else PutFixedBody(job, out);
+    if (job.model.scientific)
+        PutScientificBody(job, out);
+    else
+        PutFixedBody(job, out);
     if (job.model.currency == FormatModel::Currency::trailing) out->Put(Money(job));
     PutSignAfter(job, out);
 }
@@ -152,7 +160,8 @@ template <class Put> void PutFilled(bool fill, std::size_t width, Writer* out, P
     put(&trial);
     if (fill) {
         const std::size_t bytes = std::min(trial.Length(), sizeof counted);
-        const std::size_t extra = bytes - CountCharacters({counted, bytes});  // bytes that are no characters of their own
+        const std::size_t extra =
+            bytes - CountCharacters({counted, bytes});  // bytes that are no characters of their own
         out->Repeat(' ', static_cast<std::ptrdiff_t>(width + extra) - static_cast<std::ptrdiff_t>(trial.Length()));
     }
     put(out);
@@ -249,11 +258,13 @@ Errno PutRoman(const OCINumber& value, const FormatModel& model, Writer* out) {
 
 void PutShortest(const OCINumber& value, const FormatModel& model, const Nls& nls, Writer* out) {
     const Decimal decimal = DecimalOf(value);
-    const bool scientific =
-        model.kind == FormatModel::Kind::shortest_scientific || FixedPlaces(decimal) + decimal.negative > kMostFixedPlaces;
+    const bool scientific = model.kind == FormatModel::Kind::shortest_scientific ||
+                            FixedPlaces(decimal) + decimal.negative > kMostFixedPlaces;
     if (decimal.negative) out->Put('-');
-    if (scientific) PutScientific(decimal, nls.decimal, out);
-    else PutFixed(decimal, nls.decimal, out);
+    if (scientific)
+        PutScientific(decimal, nls.decimal, out);
+    else
+        PutFixed(decimal, nls.decimal, out);
 }
 
 Errno PutByModel(const OCINumber& value, const FormatModel& model, const Nls& nls, Writer* out) {

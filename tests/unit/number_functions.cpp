@@ -56,10 +56,10 @@ struct Function {
     number::Unary function;
     int (*reference)(mpfr_ptr, mpfr_srcptr, mpfr_rnd_t);
 };
-constexpr Function kFunctions[] = {
-    {"exp", number::Exp, mpfr_exp},        {"sin", number::Sin, mpfr_sin},        {"cos", number::Cos, mpfr_cos},
-    {"tan", number::Tan, mpfr_tan},        {"arctan", number::ArcTan, mpfr_atan}, {"hypsin", number::HypSin, mpfr_sinh},
-    {"hypcos", number::HypCos, mpfr_cosh}, {"hyptan", number::HypTan, mpfr_tanh}};
+constexpr Function kFunctions[] = {{"exp", number::Exp, mpfr_exp},        {"sin", number::Sin, mpfr_sin},
+                                   {"cos", number::Cos, mpfr_cos},        {"tan", number::Tan, mpfr_tan},
+                                   {"arctan", number::ArcTan, mpfr_atan}, {"hypsin", number::HypSin, mpfr_sinh},
+                                   {"hypcos", number::HypCos, mpfr_cosh}, {"hyptan", number::HypTan, mpfr_tanh}};
 constexpr Function kInverse[] = {{"arcsin", number::ArcSin, mpfr_asin}, {"arccos", number::ArcCos, mpfr_acos}};
 
 void ExpectFunction(const Function& row, const OCINumber& value) {
@@ -150,15 +150,29 @@ TEST(NumberFunctions, FunctionsOfTwoNumbers) {
 }
 
 TEST(NumberFunctions, PowersThatAreExact) {
-    const struct { const char* base; const char* exponent; const char* result; } cases[] = {
-        {"2", "10", "1024"},        {"2", "-3", "0.125"},   {"4", "0.5", "2"},      {"0.25", "-1.5", "8"},
-        {"-2", "3", "-8"},          {"-2", "4", "16"},      {"0", "0", "1"},        {"0", "2.5", "0"},
-        {"7", "0", "1"},            {"10", "-130", "1E-130"}, {"10", "125", "1E125"}, {"1", "1E125", "1"},
-        {"-1", "1E125", "1"},       {"-1", "-7", "-1"},     {"9.5367431640625E-7", "0.05", "0.5"},
-        // Exact ties, rounded away from zero: 41 digits with a 5 at the end.
-        {"1.00000000000000000005", "2", "1.0000000000000000001"},
-        {"-3.00000000000000000005", "2", "9.0000000000000000003"},
-        {"1.0000000000000000001000000000000000000025", "0.5", "1.00000000000000000005"}};
+    const struct {
+        const char* base;
+        const char* exponent;
+        const char* result;
+    } cases[] = {{"2", "10", "1024"},
+                 {"2", "-3", "0.125"},
+                 {"4", "0.5", "2"},
+                 {"0.25", "-1.5", "8"},
+                 {"-2", "3", "-8"},
+                 {"-2", "4", "16"},
+                 {"0", "0", "1"},
+                 {"0", "2.5", "0"},
+                 {"7", "0", "1"},
+                 {"10", "-130", "1E-130"},
+                 {"10", "125", "1E125"},
+                 {"1", "1E125", "1"},
+                 {"-1", "1E125", "1"},
+                 {"-1", "-7", "-1"},
+                 {"9.5367431640625E-7", "0.05", "0.5"},
+                 // Exact ties, rounded away from zero: 41 digits with a 5 at the end.
+                 {"1.00000000000000000005", "2", "1.0000000000000000001"},
+                 {"-3.00000000000000000005", "2", "9.0000000000000000003"},
+                 {"1.0000000000000000001000000000000000000025", "0.5", "1.00000000000000000005"}};
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::Power(Number(c.base), Number(c.exponent), &got), 0) << c.base << " " << c.exponent;
@@ -173,7 +187,12 @@ TEST(NumberFunctions, PowersThatAreExact) {
 }
 
 TEST(NumberFunctions, OutsideTheDomain) {
-    const struct { number::Binary function; const char* left; const char* right; number::Errno error; } cases[] = {
+    const struct {
+        number::Binary function;
+        const char* left;
+        const char* right;
+        number::Errno error;
+    } cases[] = {
         {number::Power, "0", "-1", number::kDividedByZero}, {number::Power, "-2", "0.5", number::kBadNumber},
         {number::Log, "1", "5", number::kBadNumber},        {number::Log, "0", "5", number::kBadNumber},
         {number::Log, "-2", "5", number::kBadNumber},       {number::Log, "2", "0", number::kBadNumber},

@@ -41,7 +41,8 @@ public:
             const int byte = value.OCINumberPart[i];
             if (negative && byte == 102) break;
             mpz_mul_ui(mpq_numref(value_), mpq_numref(value_), 100);
-            mpz_add_ui(mpq_numref(value_), mpq_numref(value_), static_cast<unsigned long>(negative ? 101 - byte : byte - 1));
+            mpz_add_ui(mpq_numref(value_), mpq_numref(value_),
+                       static_cast<unsigned long>(negative ? 101 - byte : byte - 1));
             last = i;
         }
         Scale((negative ? 62 - value.OCINumberPart[1] : value.OCINumberPart[1] - 193) - (last - 2));
@@ -57,8 +58,10 @@ public:
         mpq_t factor;
         mpq_init(factor);
         mpz_ui_pow_ui(mpq_numref(factor), 100, static_cast<unsigned long>(power < 0 ? -power : power));
-        if (power < 0) mpq_div(value_, value_, factor);
-        else mpq_mul(value_, value_, factor);
+        if (power < 0)
+            mpq_div(value_, value_, factor);
+        else
+            mpq_mul(value_, value_, factor);
         mpq_clear(factor);
     }
 
