@@ -94,7 +94,7 @@ const ExternalType* FindType(std::uint16_t code) {
 // Numbers and dates of fixed form may lie in a larger area; integers and reals fill theirs; pointers need no size.
 int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area) {
     if (type.is_pointer && size <= 0) size = kPointer;
-    const bool variable = type.family == Family::text || type.family == Family::bytes;
+    const bool variable = !type.is_pointer && (type.family == Family::text || type.family == Family::bytes);
     if (size < type.least_size) return variable ? kBadAreaLength : kBadFixedLength;
     const bool power_of_two = (size & (size - 1)) == 0;
     if (type.family == Family::integer && (size > 8 || !power_of_two)) return kBadFixedLength;

@@ -1,0 +1,344 @@
+// Conversions between the database's values and the application's elements, through binds and defines of one value.
+#include <cmath>
+#include <limits>
+
+#include "statement_fixture.h"
+
+namespace {
+
+std::string Hex(const std::string& bytes) {
+    std::string hex;
+    for (const char byte : bytes) {
+        char pair[3];
+        std::snprintf(pair, sizeof pair, "%02X", static_cast<unsigned char>(byte));
+        hex += pair;
+    }
+    return hex;
+}
+
+template <class T>
+std::string Raw(T value) { return {reinterpret_cast<const char*>(&value), sizeof value}; }
+
+class Conversions : public StatementTest {
+protected:
+    using StatementTest::StatementTest;
+
+    // What a define of `size` bytes holds after fetching an expression: bytes as the type lays them, or "!" and a number.
+    std::string Out(const std::string& expression, ub2 type, sb4 size) {
+        std::string area(static_cast<std::size_t>(size), '#');
+        ub2 code = 0;
+        length_ = 0;
+        indicator_ = 9;
+        sb4 answer = Prepare("select " + expression + " from dual");
+        if (answer == 0) answer = Define(1, {area.data(), size, type, &indicator_, &length_, &code});
+        if (answer == 0) answer = Execute(1);
+        return answer == 0 || answer == 24345 ? area : "!" + std::to_string(answer);
+    }
+    // What the database sees of an element.
+    std::string In(const std::string& area, ub2 type, const std::string& seen_through = "quote(:1)", ub2* length = nullptr) {
+        std::string copy = area;
+        char text[200] = "";
+        sb2 indicator = 0;
+        sb4 answer = Prepare("select " + seen_through + " from dual");
+        if (answer == 0) answer = Bind(1, {copy.data(), static_cast<sb4>(copy.size()), type, nullptr, length});
+        if (answer == 0) answer = Define(1, {text, sizeof text, SQLT_STR, &indicator});
+        if (answer == 0) answer = Execute(1);
+        if (answer != 0) return "!" + std::to_string(answer);
+        return indicator == -1 ? "-" : text;
+    }
+
+    ub2 length_ = 0;
+    sb2 indicator_ = 0;
+};
+
+TEST_F(Conversions, TextAndBytesInEachLayout) {
+    const struct { const char* expression; ub2 type; sb4 size; const char* hex; ub2 length; sb2 indicator; } cases[] = {
+        {"'abc'", SQLT_CHR, 5, "6162632323", 3, 0},
+        {"'abc'", SQLT_CHR, 2, "6162", 2, 3},
+        {"'abc'", SQLT_LNG, 3, "616263", 3, 0},
+        {"'abc'", SQLT_STR, 5, "6162630023", 3, 0},
+        {"'abc'", SQLT_STR, 4, "61626300", 3, 0},
+        {"'abc'", SQLT_STR, 3, "616200", 2, 3},
+        {"'abc'", SQLT_STR, 1, "00", 0, 3},
+        {"'abc'", SQLT_AFC, 5, "6162632020", 5, 0},
+        {"'abc'", SQLT_AFC, 2, "6162", 2, 3},
+        {"'abc'", SQLT_VCS, 6, "030061626323", 5, 0},
+        {"'abc'", SQLT_VCS, 4, "02006162", 4, 3},
+        {"'abc'", SQLT_AVC, 5, "0300616263", 5, 0},
+        {"'abc'", SQLT_LVC, 8, "0300000061626323", 7, 0},
+        {"'a\xc3\xa4'", SQLT_CHR, 2, "6123", 1, 3},    // never half a character
+        {"x'0AFF'", SQLT_CHR, 4, "30414646", 4, 0},
+        {"x'0AFF'", SQLT_BIN, 3, "0AFF23", 2, 0},
+        {"x'0AFF'", SQLT_LBI, 1, "0A", 1, 2},
+        {"x'0AFF'", SQLT_VBI, 4, "02000AFF", 4, 0},
+        {"x'0AFF01'", SQLT_VBI, 4, "02000AFF", 4, 3},
+        {"'0aF'", SQLT_BIN, 4, "00AF2323", 2, 0},
+        {"'0ag'", SQLT_BIN, 4, nullptr, 1465, 0},
+        {"12", SQLT_BIN, 4, nullptr, 932, 0},
+    };
+    for (const auto& c : cases) {
+        const std::string shown = std::string(c.expression) + " as " + std::to_string(c.type) + " in " + std::to_string(c.size);
+        const std::string area = Out(c.expression, c.type, c.size);
+        if (!c.hex) {
+            EXPECT_EQ(area, "!" + std::to_string(c.length)) << shown;
+            continue;
+        }
+        EXPECT_EQ(Hex(area), c.hex) << shown;
+        EXPECT_EQ(length_, c.length) << shown;
+        EXPECT_EQ(indicator_, c.indicator) << shown;
+    }
+}
+
+TEST_F(Conversions, NumbersAsText) {
+    const struct { const char* expression; const char* text; } cases[] = {
+        {"0", "0"}, {"-12", "-12"}, {"9223372036854775807", "9223372036854775807"}, {"0.5", ".5"}, {"-0.25", "-.25"},
+        {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"}, {"1e39", "1000000000000000000000000000000000000000"},
+        {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"}, {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf"}, {"-9e999", "-Inf"},
+        {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"},
+    };
+    for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.text) << c.expression;
+}
+
+TEST_F(Conversions, Integers) {
+    const struct { const char* expression; ub2 type; sb4 size; sb8 value; sb4 error; } cases[] = {
+        {"-128", SQLT_INT, 1, -128, 0}, {"-129", SQLT_INT, 1, 0, 1455}, {"32767", SQLT_INT, 2, 32767, 0}, {"32768", SQLT_INT, 2, 0, 1455},
+        {"-2147483648", SQLT_INT, 4, -2147483648LL, 0}, {"2147483648", SQLT_INT, 4, 0, 1455},
+        {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0}, {"9.3e18", SQLT_INT, 8, 0, 1455}, {"-9.3e18", SQLT_INT, 8, 0, 1455},
+        {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0}, {"-2.99", SQLT_INT, 4, -2, 0}, {"' 17 '", SQLT_INT, 4, 17, 0},
+        {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722}, {"x'01'", SQLT_INT, 4, 0, 932},
+        {"255", SQLT_UIN, 1, 255, 0}, {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455}, {"-0.5", SQLT_UIN, 4, 0, 0},
+        {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
+        {"cast('18446744073709551615' as number)", SQLT_UIN, 8, -1, 0},
+        {"cast('18446744073709551616' as number)", SQLT_UIN, 8, 0, 1455}, {"date '2024-01-01'", SQLT_INT, 4, 0, 1722},
+    };
+    for (const auto& c : cases) {
+        const std::string shown = std::string(c.expression) + " as " + std::to_string(c.type) + " in " + std::to_string(c.size);
+        const std::string area = Out(c.expression, c.type, c.size);
+        if (c.error != 0) {
+            EXPECT_EQ(area, "!" + std::to_string(c.error)) << shown;
+        } else {
+            EXPECT_EQ(Hex(area), Hex(Raw(c.value).substr(0, static_cast<std::size_t>(c.size)))) << shown;
+            EXPECT_EQ(length_, c.size) << shown;
+        }
+    }
+}
+
+TEST_F(Conversions, OtherNumbers) {
+    EXPECT_EQ(Out("'0.1'", SQLT_FLT, 8), Raw(0.1));
+    EXPECT_EQ(Out("0.1", SQLT_FLT, 4), Raw(0.1f));
+    EXPECT_EQ(Out("1e39", SQLT_FLT, 4), "!1426");
+    EXPECT_EQ(Out("3", SQLT_IBDOUBLE, 8), Raw(3.0));
+    for (const ub2 type : {SQLT_NUM, SQLT_VNU}) {
+        EXPECT_EQ(Hex(Out("123.45", type, 22).substr(0, 5)), "04C202182E") << type;
+        EXPECT_EQ(Hex(Out("'-1'", type, 22).substr(0, 4)), "033E6466") << type;
+        EXPECT_EQ(Out("'x'", type, 22), "!1722") << type;
+    }
+    EXPECT_EQ(length_, 0);
+    EXPECT_EQ(Hex(Out("-12345", SQLT_PDN, 3)), "12345D");
+    EXPECT_EQ(Hex(Out("7", SQLT_PDN, 3)), "00007C");
+    EXPECT_EQ(Out("123456", SQLT_PDN, 3), "!1457");
+    // Decimal floats come back through the same types and are shown by the cast that displays them.
+    for (const char* number : {"0", "1.5", "-123456789.012345", "1E+100", "1234567890123456"}) {
+        const std::string wide = Out(std::string("'") + number + "'", SQLT_BDOUBLE, 16);
+        const std::string narrow = Out(std::string("'") + number + "'", SQLT_BFLOAT, 8);
+        EXPECT_EQ(In(wide, SQLT_BDOUBLE, "cast(cast(:1 as decfloat(34)) as varchar(100))"), number);
+        EXPECT_EQ(In(narrow, SQLT_BFLOAT, "cast(cast(:1 as decfloat(34)) as varchar(100))"), number);
+    }
+}
+
+TEST_F(Conversions, PackedDecimalWithScale) {
+    OCIDefine* define = nullptr;
+    char area[4] = "";
+    ASSERT_EQ(Prepare("select -123.456 from dual"), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ub2 precision = 5;
+    sb2 scale = 2;
+    ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &precision, 0, OCI_ATTR_PDPRC, err)), 0);
+    ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &scale, 0, OCI_ATTR_PDSCL, err)), 0);
+    ASSERT_EQ(Execute(1), 0);
+    EXPECT_EQ(Hex(std::string(area, 4)), "0012346D");
+    ASSERT_EQ(Prepare("select 1234.5 from dual"), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Execute(1), 1457) << "six digits, and the precision is five";
+}
+
+TEST_F(Conversions, Dates) {
+    MustRun("create table d(d date, s timestamp, v varchar2(30))");
+    MustRun("insert into d values(date '2024-02-29', timestamp '2024-02-29 13:05:00.25', '29-FEB-24')");
+    EXPECT_EQ(One("select d from d"), "29-FEB-24");
+    EXPECT_EQ(One("select s from d"), "29-FEB-24 01.05.00.250000 PM");
+    const std::string day = Raw<ub1>(120) + Raw<ub1>(124) + "\x02\x1D\x01\x01\x01";
+    const auto fetch = [&](const char* column, ub2 type, sb4 size) {
+        std::string area(static_cast<std::size_t>(size), '\0');
+        sb4 answer = Prepare(std::string("select ") + column + " from d");
+        if (answer == 0) answer = Define(1, {area.data(), size, type});
+        if (answer == 0) answer = Execute(1);
+        return answer == 0 ? Hex(area) : "!" + std::to_string(answer);
+    };
+    EXPECT_EQ(fetch("d", SQLT_DAT, 7), Hex(day));
+    EXPECT_EQ(fetch("v", SQLT_DAT, 7), Hex(day)) << "text in the default model";
+    EXPECT_EQ(fetch("s", SQLT_DAT, 7), Hex(day.substr(0, 4) + "\x0E\x06\x01"));
+    EXPECT_EQ(fetch("1", SQLT_DAT, 7), "!932");
+    EXPECT_EQ(fetch("'31-FEB-24'", SQLT_DAT, 7), "!1839");
+    EXPECT_EQ(fetch("'no date'", SQLT_ODT, 8).substr(0, 3), "!18");
+    const OCIDate oci{2024, 2, 29, {0, 0, 0}};
+    EXPECT_EQ(fetch("d", SQLT_ODT, 8).substr(0, 14), Hex(Raw(oci)).substr(0, 14));
+
+    EXPECT_EQ(In(day, SQLT_DAT), "'2024-02-29 00:00:00'");
+    EXPECT_EQ(In(Raw(oci), SQLT_ODT), "'2024-02-29 00:00:00'");
+    EXPECT_EQ(In(Raw(OCIDate{2024, 2, 30, {0, 0, 0}}), SQLT_ODT), "!1839");
+    EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT).substr(0, 3), "!18");
+}
+
+TEST_F(Conversions, DatetimeDescriptors) {
+    auto* datetime = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
+    const std::string element = Raw(datetime);
+    EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!1866") << "never set";
+    ASSERT_EQ(Prepare("select timestamp '2024-02-29 13:05:07.5' from dual"), 0);
+    ASSERT_EQ(Define(1, {&datetime, 8, SQLT_TIMESTAMP}), 0);
+    ASSERT_EQ(Execute(1), 0);
+    EXPECT_EQ(In(element, SQLT_TIMESTAMP), "'2024-02-29 13:05:07.5'");
+    void* const wrong[] = {nullptr, stmt, this};
+    for (void* pointer : wrong) {
+        EXPECT_EQ(In(Raw(pointer), SQLT_TIMESTAMP), "!21710");
+        ASSERT_EQ(Prepare("select timestamp '2024-02-29 13:05:07.5' from dual"), 0);
+        ASSERT_EQ(Define(1, {&pointer, 8, SQLT_DATE}), 0);
+        EXPECT_EQ(Execute(1), 21710);
+    }
+    EXPECT_EQ(OCIDescriptorFree(datetime, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
+    EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!21710") << "freed";
+}
+
+TEST_F(Conversions, StringsAndRaws) {
+    OCIString* string = nullptr;
+    OCIRaw* raw = nullptr;
+    ASSERT_EQ(Prepare("select 'abc', x'00FF' from dual"), 0);
+    ASSERT_EQ(Define(1, {&string, 8, SQLT_VST}), 0);
+    ASSERT_EQ(Define(2, {&raw, 8, SQLT_LVB}), 0);
+    ASSERT_EQ(Execute(1), 0);
+    EXPECT_EQ(std::string(reinterpret_cast<char*>(OCIStringPtr(env, string)), OCIStringSize(env, string)), "abc");
+    EXPECT_EQ(Hex(std::string(reinterpret_cast<char*>(OCIRawPtr(env, raw)), OCIRawSize(env, raw))), "00FF");
+    EXPECT_EQ(In(Raw(string), SQLT_VST), "'abc'");
+    EXPECT_EQ(In(Raw(raw), SQLT_LVB), "X'00FF'");
+    EXPECT_EQ(In(Raw<void*>(nullptr), SQLT_VST), "NULL");
+    EXPECT_EQ(In(Raw(raw), SQLT_VST), "!21710");
+}
+
+TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
+    const auto bytes = [](const char* text, std::size_t size) { return std::string(text, size); };
+    const struct { std::string area; ub2 type; int length; const char* seen; } cases[] = {
+        {"abc", SQLT_CHR, -1, "'abc'"}, {"abc", SQLT_CHR, 2, "'ab'"}, {"abc", SQLT_CHR, 0, "NULL"}, {"abc", SQLT_CHR, 4, "!1485"},
+        {"abc", SQLT_AFC, -1, "'abc'"}, {"ab ", SQLT_AFC, -1, "'ab '"}, {"", SQLT_CHR, -1, "NULL"},
+        {bytes("abc\0x", 5), SQLT_STR, -1, "'abc'"}, {bytes("abc\0", 4), SQLT_STR, 2, "'ab'"}, {"abc", SQLT_STR, -1, "!1480"},
+        {"abc", SQLT_STR, 3, "'abc'"}, {bytes("\0", 1), SQLT_STR, -1, "NULL"},
+        {bytes("\2\0abc", 5), SQLT_VCS, -1, "'ab'"}, {bytes("\3\0abc", 5), SQLT_AVC, 1, "'abc'"},
+        {bytes("\4\0abc", 5), SQLT_VCS, -1, "!1458"}, {bytes("\377\377abc", 5), SQLT_AVC, -1, "!1458"},
+        {bytes("\1\0\0\0abc", 7), SQLT_LVC, -1, "'a'"}, {bytes("\377\377\377\377abc", 7), SQLT_LVC, -1, "!1458"},
+        {"abc", SQLT_BIN, -1, "X'616263'"}, {"abc", SQLT_LBI, 1, "X'61'"}, {bytes("\1\0abc", 5), SQLT_VBI, -1, "X'61'"},
+        {Raw<sb1>(-5), SQLT_INT, -1, "-5"}, {Raw<sb8>(INT64_MIN), SQLT_INT, -1, "-9223372036854775808"},
+        {Raw<ub1>(200), SQLT_UIN, -1, "200"}, {Raw(1.5f), SQLT_FLT, -1, "1.5"}, {Raw(-0.25), SQLT_FLT, -1, "-0.25"},
+        {bytes("\x12\x34\x5D", 3), SQLT_PDN, -1, "-12345"}, {bytes("\x12\x34\x55", 3), SQLT_PDN, -1, "!1413"},
+        {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"},
+        {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"}, {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
+        {std::string(8, '\0'), SQLT_CLOB, -1, "!932"}, {std::string(8, '\0'), SQLT_CUR, -1, "!932"},
+        {std::string(8, '\0'), SQLT_RDD, -1, "!21710"},
+    };
+    for (const auto& c : cases) {
+        ub2 length = static_cast<ub2>(c.length);
+        EXPECT_EQ(In(c.area, c.type, "quote(:1)", c.length >= 0 ? &length : nullptr), c.seen)
+            << Hex(c.area) << " as " << c.type << ", length " << c.length;
+    }
+    EXPECT_EQ(In(Raw<ub8>(UINT64_MAX), SQLT_UIN, "cast(:1 as number)"), "18446744073709551615");
+}
+
+TEST_F(Conversions, SizesThatATypeCannotHave) {
+    const struct { ub2 type; sb4 size; sb4 answer; } cases[] = {
+        {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, 0, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483},
+        {SQLT_FLT, 2, 1483}, {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0}, {SQLT_DAT, 6, 1483},
+        {SQLT_ODT, 7, 1483}, {SQLT_BFLOAT, 7, 1483}, {SQLT_BDOUBLE, 8, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483},
+        {SQLT_CHR, -1, 1459}, {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459}, {SQLT_LVC, 3, 1459},
+        {SQLT_BIN, -5, 1459}, {SQLT_VBI, 1, 1459}, {SQLT_VST, 4, 1483}, {SQLT_VST, 0, 0}, {SQLT_RSET, -1, 0}, {SQLT_TIME, 7, 1483},
+        {0, 8, 3115}, {10, 8, 3115}, {SQLT_NTY, 8, 3115}, {9999, 8, 3115},
+    };
+    char area[200] = "";
+    for (const auto& c : cases) {
+        ASSERT_EQ(Prepare("select :1 from dual"), 0);
+        EXPECT_EQ(Bind(1, {area, c.size, c.type}), c.answer) << c.type << " in " << c.size;
+        EXPECT_EQ(Define(1, {area, c.size, c.type}), c.answer) << c.type << " in " << c.size;
+    }
+}
+
+// Columns of large objects read and write as text and bytes.
+TEST_F(Conversions, LargeObjectsAsTextAndBytes) {
+    MustRun("create table l(c clob, b blob)");
+    std::string text(100000, 'x');
+    text += "end";
+    ASSERT_EQ(Prepare("insert into l values(:1, :2)"), 0);
+    ASSERT_EQ(Bind(1, {text.data(), static_cast<sb4>(text.size()), SQLT_CHR}), 0);
+    ASSERT_EQ(Bind(2, {text.data(), static_cast<sb4>(text.size()), SQLT_LBI}), 0);
+    ASSERT_EQ(Execute(), 0);
+    std::string out[2] = {std::string(text.size() + 1, '#'), std::string(text.size(), '#')};
+    ASSERT_EQ(Prepare("select c, b from l"), 0);
+    ASSERT_EQ(Define(1, {out[0].data(), static_cast<sb4>(out[0].size()), SQLT_STR}), 0);
+    ASSERT_EQ(Define(2, {out[1].data(), static_cast<sb4>(out[1].size()), SQLT_BIN}), 0);
+    ASSERT_EQ(Execute(1), 0);
+    EXPECT_STREQ(out[0].c_str(), text.c_str());
+    EXPECT_EQ(out[1], text);
+}
+
+class Utf16Conversions : public Conversions {
+protected:
+    Utf16Conversions() : Conversions(OCI_UTF16) {}
+};
+
+TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
+    const struct { const char* expression; ub2 type; sb4 size; const char* hex; ub2 length; } cases[] = {
+        {"'ab'", SQLT_CHR, 5, "6100620023", 4},
+        {"'ab'", SQLT_CHR, 3, "610023", 2},
+        {"'ab'", SQLT_STR, 6, "610062000000", 4},
+        {"'ab'", SQLT_STR, 5, "6100000023", 2},
+        {"'ab'", SQLT_AFC, 6, "610062002000", 6},
+        {"'ab'", SQLT_VCS, 6, "040061006200", 6},
+        {"12.5", SQLT_CHR, 8, "310032002E003500", 8},
+        {"x'FF'", SQLT_BIN, 1, "FF", 1},
+        {"char(128512)", SQLT_CHR, 3, "232323", 0},    // a pair that does not fit is left out whole
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << c.expression << " as " << c.type << " in " << c.size;
+        EXPECT_EQ(length_, c.length) << c.expression << " as " << c.type << " in " << c.size;
+    }
+    ASSERT_EQ(Prepare("select length(:1), :2 from dual"), 0);
+    std::string in = Encoded("abc");
+    std::string terminated = Encoded("xy") + std::string(2, '\0');
+    sb4 count = 0;
+    char out[10] = "";
+    ASSERT_EQ(Bind(1, {in.data(), static_cast<sb4>(in.size()), SQLT_CHR}), 0);
+    ASSERT_EQ(BindName("2", {terminated.data(), static_cast<sb4>(terminated.size()), SQLT_STR}), 0);
+    ASSERT_EQ(Define(1, {&count, 4, SQLT_INT}), 0);
+    ASSERT_EQ(Define(2, {out, 10, SQLT_STR}), 0);
+    ASSERT_EQ(Execute(1), 0);
+    EXPECT_EQ(count, 3);
+    EXPECT_EQ(std::string(out, 6), terminated);
+    in = {'\0', '\xD8'};
+    ASSERT_EQ(Bind(1, {in.data(), 2, SQLT_CHR}), 0);
+    EXPECT_EQ(Execute(1), 24365) << "half a pair";
+}
+
+TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
+    ASSERT_EQ(Prepare("select :name as col from dual where"), 0);
+    OraText* text = nullptr;
+    ub4 length = 0;
+    ASSERT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, &text, &length, OCI_ATTR_STATEMENT, err)), 0);
+    EXPECT_EQ(length, 70u);
+    char value[8] = "";
+    ASSERT_EQ(BindName(":Name", {value, 8, SQLT_STR}), 0);
+    EXPECT_NE(Execute(0), 0);
+    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET) % 2, 0) << "bytes of whole units";
+    OraText* names[1];
+    ub1 lengths[1];
+    sb4 found = 0;
+    ASSERT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 1, 1, &found, names, lengths, nullptr, nullptr, nullptr, nullptr)), 0);
+    EXPECT_EQ(std::string(reinterpret_cast<char*>(names[0]), lengths[0]), Encoded("NAME"));
+}
+
+}  // namespace
