@@ -1,5 +1,5 @@
-// Datum: one value on its way between an engine and the application, as a view. A Datum owns nothing; `data` is borrowed
-// and valid as long as the call that filled it says.
+// Datum: one value on its way between an engine and the application, as a view. A Datum owns nothing; `data` is
+// borrowed and valid as long as the call that filled it says.
 #pragma once
 
 #include <cstddef>

@@ -1,6 +1,7 @@
 // What a database does for the library. Texts are UTF-8. A connection and what it made serve one thread at a time,
-// Cancel aside. A statement that fails undoes itself and not the transaction. Every call answers a Status: error numbers
-// are the published ones, with the engine's own words after them where it had some. Nothing here throws but bad_alloc.
+// Cancel aside. A statement that fails undoes itself and not the transaction. Every call answers a Status: error
+// numbers are the published ones, with the engine's own words after them where it had some. Nothing here throws but
+// bad_alloc.
 #pragma once
 
 #include <cstdint>
@@ -18,7 +19,7 @@ namespace engine {
 // A column of a select list.
 struct Column {
     std::string name;             // as the application sees it; unquoted names in upper case
-    std::uint16_t type = 1;       // internal type code: SQLT_CHR, SQLT_NUM, SQLT_DAT, SQLT_AFC, SQLT_BIN, SQLT_CLOB, ...
+    std::uint16_t type = 1;       // internal type code: SQLT_CHR, SQLT_NUM, SQLT_DAT, SQLT_AFC, SQLT_BIN, ...
     std::uint32_t size = 0;       // bytes; 0 when the engine sets no limit
     std::uint8_t precision = 0;   // decimal digits; 0 when not constrained
     std::int8_t scale = 0;        // -127: floating
@@ -61,8 +62,8 @@ public:
 
     // Starts a query with row `row` of the source bound. Values are taken over; the source may go afterwards.
     virtual Status Open(RowSource& source, std::uint32_t row) = 0;
-    // Steps to the next row and fills one view a column, valid until the next call on this query. `more` is false at the
-    // end; the query is closed then.
+    // Steps to the next row and fills one view a column, valid until the next call on this query. `more` is false at
+    // the end; the query is closed then.
     virtual Status Fetch(std::span<Datum> values, bool& more) = 0;
     // Ends an open query early; harmless when none is open.
     virtual void Close() noexcept = 0;

@@ -1,4 +1,4 @@
-// Environments and the process: OCIEnvCreate, OCIEnvInit, OCIInitialize, OCITerminate, OCIClientVersion, the block count.
+// Environments and the process: OCIEnvCreate, OCIEnvInit, OCIInitialize, OCITerminate, version, block count.
 #include <cstdint>
 #include <limits>
 
@@ -37,7 +37,8 @@ sword OCIEnvInit(OCIEnv** envOut, ub4 mode, size_t extra, dvoid** extraOut) {
     return OpenEnvironment(envOut, defaults.mode | own_mode, defaults.memory, extra, extraOut);
 }
 
-sword OCIInitialize(ub4 mode, const dvoid* memctx, OCIAllocFunction allocate, OCIReallocFunction, OCIFreeFunction release) {
+sword OCIInitialize(ub4 mode, const dvoid* memctx, OCIAllocFunction allocate, OCIReallocFunction,
+                    OCIFreeFunction release) {
     SetProcessDefaults({mode, Functions(memctx, allocate, release)});
     return OCI_SUCCESS;
 }

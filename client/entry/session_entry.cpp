@@ -73,7 +73,8 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
     if (status.Failed()) return status;
     engine::Credentials credentials;
     std::string database;
-    status = ReadCredentials(environment, texts.user, texts.user_length, texts.password, texts.password_length, credentials);
+    status =
+        ReadCredentials(environment, texts.user, texts.user_length, texts.password, texts.password_length, credentials);
     if (status.Ok()) status = ReadDatabase(environment, texts.database, texts.database_length, database);
     if (status.Failed()) return status;
 
@@ -186,13 +187,13 @@ sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
 
 }  // namespace
 
-sword OCILogon(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw, ub4 pwLen,
-               const OraText* db, ub4 dbLen) {
+sword OCILogon(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw,
+               ub4 pwLen, const OraText* db, ub4 dbLen) {
     return OCILogon2(env, err, svcOut, user, userLen, pw, pwLen, db, dbLen, OCI_DEFAULT);
 }
 
-sword OCILogon2(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw, ub4 pwLen,
-                const OraText* db, ub4 dbLen, ub4 mode) {
+sword OCILogon2(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw,
+                ub4 pwLen, const OraText* db, ub4 dbLen, ub4 mode) {
     return Enter<Environment>(env, err, [&](Environment& environment) {
         return LogOn(environment, svcOut, {user, userLen, pw, pwLen, db, dbLen}, mode);
     });
@@ -233,8 +234,8 @@ sword OCISessionEnd(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4) {
     });
 }
 
-sword OCIPasswordChange(OCISvcCtx* svc, OCIError* err, const OraText* user, ub4 userLen, const OraText* oldPw, ub4 oldLen,
-                        const OraText* newPw, sb4 newLen, ub4 mode) {
+sword OCIPasswordChange(OCISvcCtx* svc, OCIError* err, const OraText* user, ub4 userLen, const OraText* oldPw,
+                        ub4 oldLen, const OraText* newPw, sb4 newLen, ub4 mode) {
     return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
         PasswordTexts texts;
         const Environment& environment = service.Env();

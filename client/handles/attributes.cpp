@@ -69,7 +69,8 @@ void StoreText(Object& object, std::uint32_t attribute, std::string_view text, v
     if (size) *size = static_cast<std::uint32_t>(out.size());
 }
 
-void StoreValue(Object& object, const AttributeRow& row, const AttributeValue& value, void* target, std::uint32_t* size) {
+void StoreValue(Object& object, const AttributeRow& row, const AttributeValue& value, void* target,
+                std::uint32_t* size) {
     const std::size_t width = Width(row.shape);
     switch (row.shape) {
         case Shape::text: return StoreText(object, row.attribute, value.text, target, size);

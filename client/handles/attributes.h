@@ -1,6 +1,6 @@
 // Attributes: what OCIAttrGet and OCIAttrSet know. Each class supplies rows (Object::Attributes); a row says how the
-// value lies in the application's memory and which functions read and write it. The checks, the copying in and out, text
-// conversion and the numbers 24315 (unknown or not readable), 24328 (bad value) and 21560 (null) are here, once.
+// value lies in the application's memory and which functions read and write it. The checks, the copying in and out,
+// text conversion and the numbers 24315 (unknown or not readable), 24328 (bad value) and 21560 (null) are here, once.
 //
 //   constexpr AttributeRow kRows[] = {
 //       {OCI_ATTR_PREFETCH_ROWS, Shape::ub4, GetField<&Statement::prefetch_rows>, SetField<&Statement::prefetch_rows>},
@@ -18,7 +18,7 @@
 enum class Shape : std::uint8_t {
     ub1, ub2, ub4, ub8,    // integers of either sign, by address, in `integer`
     text,                  // characters and a length in bytes; UTF-8 in `text`. Get: it must live on in the object
-    handle,                // a pointer to an object or anything else, in `pointer`; null when none. Set: as given, unchecked
+    handle,                // a pointer to an object or anything else, in `pointer`; null: none. Set: as given
     bytes,                 // raw bytes in `text`; get copies them into the application's memory, set reads `size` bytes
     descriptor             // get: the application's own descriptor in `pointer`, to be filled
 };

@@ -1,5 +1,6 @@
 // The set of living objects: a hash table from pointer to kind. Readers take no lock: a slot is a pair of atomics, a
-// table that grew is published anew and the old one kept, since a reader may still be looking at it. Writers hold a mutex.
+// table that grew is published anew and the old one kept, since a reader may still be looking at it. Writers hold a
+// mutex.
 #include <atomic>
 #include <memory>
 #include <vector>

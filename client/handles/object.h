@@ -1,8 +1,8 @@
 // Objects: everything the library hands out by pointer (handles, descriptors, strings, raws, files, thread objects).
 //
 // An object belongs to an environment and hangs below a parent (the environment, a statement, a describe handle, ...):
-// destroying the parent destroys it. Its memory comes from the environment. What the application passes in is checked by
-// Live, which asks the set of living objects and never reads the memory behind an unknown pointer.
+// destroying the parent destroys it. Its memory comes from the environment. What the application passes in is checked
+// by Live, which asks the set of living objects and never reads the memory behind an unknown pointer.
 #pragma once
 
 #include <cstddef>
@@ -40,7 +40,8 @@ struct Origin {
 
 class Object {
 public:
-    explicit Object(const Origin& origin) : environment_(&origin.environment), parent_(origin.parent), type_(origin.type) {}
+    explicit Object(const Origin& origin)
+        : environment_(&origin.environment), parent_(origin.parent), type_(origin.type) {}
     virtual ~Object() = default;
     Object(const Object&) = delete;
     Object& operator=(const Object&) = delete;

@@ -1,5 +1,5 @@
-// Status: what a call below the entry points answers: a return code and, for all but success, the published error number
-// and the engine's own words where it had some. The gate (gate.h) turns it into a record and the return code.
+// Status: what a call below the entry points answers: a return code and, for all but success, the published error
+// number and the engine's own words where it had some. The gate (gate.h) turns it into a record and the return code.
 #pragma once
 
 #include <string>

@@ -37,7 +37,7 @@ void AppendUtf16(std::uint32_t point, std::string& out) {
 std::size_t DecodeUtf8(std::string_view text, std::uint32_t& point) {
     const auto byte = [text](std::size_t index) { return static_cast<unsigned char>(text[index]); };
     const unsigned lead = byte(0);
-    const std::size_t size = lead < 0x80 ? 1 : lead >= 0xF0 && lead < 0xF5 ? 4 : lead >= 0xE0 ? 3 : lead >= 0xC2 ? 2 : 0;
+    const std::size_t size = lead < 0x80 ? 1 : lead < 0xC2 ? 0 : lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
     if (size == 0 || lead >= 0xF5 || text.size() < size) return 0;
     if (size == 1) {
         point = lead;

@@ -1,5 +1,6 @@
 // Service contexts: a server, a user session and a transaction handle together; statements run on the session's link. A
-// logon makes a server and a session of its own below the context and keeps them for the next logon on the same context.
+// logon makes a server and a session of its own below the context and keeps them for the next logon on the same
+// context.
 #pragma once
 
 #include <cstdint>

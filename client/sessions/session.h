@@ -1,5 +1,5 @@
-// User sessions: who is logged on, and the link that the session's work runs on. Session handles also carry the names and
-// passwords for pools (they are authentication handles).
+// User sessions: who is logged on, and the link that the session's work runs on. Session handles also carry the names
+// and passwords for pools (they are authentication handles).
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,5 @@
-// The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good arguments,
-// with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
+// The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good
+// arguments, with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
 #include <gtest/gtest.h>
 #include <unistd.h>
 
@@ -63,8 +63,8 @@ protected:
         return number != 0 ? number : code;
     }
     sb4 LogOn(OCISvcCtx** svc, const char* user, const char* password, const char* database = "test") {
-        return Answer(OCILogon(env_, err_, svc, Text(user), Length(user), Text(password), Length(password), Text(database),
-                               Length(database)));
+        return Answer(OCILogon(env_, err_, svc, Text(user), Length(user), Text(password), Length(password),
+                               Text(database), Length(database)));
     }
     template <class T>
     T Attribute(dvoid* handle, ub4 type, ub4 attribute) {
@@ -147,29 +147,41 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
     OCIServer* server = NewHandle<OCIServer>(env_, OCI_HTYPE_SERVER);
     ub4 number = 0;
     dvoid* out = nullptr;
-    for (dvoid* bad : {static_cast<dvoid*>(nullptr), static_cast<dvoid*>(text), freed, other, static_cast<dvoid*>(text + 3)}) {
+    for (dvoid* bad :
+         {static_cast<dvoid*>(nullptr), static_cast<dvoid*>(text), freed, other, static_cast<dvoid*>(text + 3)}) {
         auto* err = static_cast<OCIError*>(bad);
         auto* svc = static_cast<OCISvcCtx*>(bad);
         auto* buf = reinterpret_cast<OraText*>(text);
         OCISvcCtx* svc_out = nullptr;
         const sword refused[] = {
-            OCIHandleAlloc(bad, &out, OCI_HTYPE_STMT, 0, nullptr), OCIHandleFree(bad, OCI_HTYPE_STMT),
-            OCIDescriptorAlloc(bad, &out, OCI_DTYPE_LOB, 0, nullptr), OCIDescriptorFree(bad, OCI_DTYPE_LOB),
+            OCIHandleAlloc(bad, &out, OCI_HTYPE_STMT, 0, nullptr),
+            OCIHandleFree(bad, OCI_HTYPE_STMT),
+            OCIDescriptorAlloc(bad, &out, OCI_DTYPE_LOB, 0, nullptr),
+            OCIDescriptorFree(bad, OCI_DTYPE_LOB),
             OCIArrayDescriptorAlloc(bad, &out, OCI_DTYPE_LOB, 1, 0, nullptr),
-            OCIErrorGet(bad, 1, nullptr, nullptr, buf, 15, OCI_HTYPE_ERROR), OCIErrorGet(bad, 1, nullptr, nullptr, buf, 15, 1),
+            OCIErrorGet(bad, 1, nullptr, nullptr, buf, 15, OCI_HTYPE_ERROR),
+            OCIErrorGet(bad, 1, nullptr, nullptr, buf, 15, 1),
             OCIAttrGet(bad, OCI_HTYPE_SVCCTX, &number, nullptr, OCI_ATTR_ENV, err_),
             OCIAttrSet(bad, OCI_HTYPE_SVCCTX, &number, 0, OCI_ATTR_SERVER, err_),
             OCIAttrGet(server, OCI_HTYPE_SERVER, &number, nullptr, OCI_ATTR_ENV, err),
             OCIAttrSet(server, OCI_HTYPE_SERVER, &number, 0, OCI_ATTR_NONBLOCKING_MODE, err),
             OCILogon(static_cast<OCIEnv*>(bad), err_, &svc_out, nullptr, 0, nullptr, 0, nullptr, 0),
-            OCILogon(env_, err, &svc_out, nullptr, 0, nullptr, 0, nullptr, 0), OCILogoff(svc, err_), OCILogoff(svc, err),
-            OCIServerAttach(static_cast<OCIServer*>(bad), err_, nullptr, 0, 0), OCIServerAttach(server, err, nullptr, 0, 0),
+            OCILogon(env_, err, &svc_out, nullptr, 0, nullptr, 0, nullptr, 0),
+            OCILogoff(svc, err_),
+            OCILogoff(svc, err),
+            OCIServerAttach(static_cast<OCIServer*>(bad), err_, nullptr, 0, 0),
+            OCIServerAttach(server, err, nullptr, 0, 0),
             OCIServerDetach(static_cast<OCIServer*>(bad), err_, 0),
             OCISessionBegin(svc, err_, static_cast<OCISession*>(bad), 1, 0),
-            OCISessionEnd(svc, err_, static_cast<OCISession*>(bad), 0), OCIPing(svc, err_, 0), OCIBreak(bad, err_),
-            OCIReset(bad, err_), OCIPasswordChange(svc, err_, buf, 2, buf, 2, buf, 2, 0),
-            OCIServerVersion(bad, err_, buf, 15, OCI_HTYPE_SVCCTX), OCIServerVersion(server, err, buf, 15, OCI_HTYPE_SERVER)};
-        for (std::size_t call = 0; call < std::size(refused); ++call) EXPECT_EQ(refused[call], OCI_INVALID_HANDLE) << call;
+            OCISessionEnd(svc, err_, static_cast<OCISession*>(bad), 0),
+            OCIPing(svc, err_, 0),
+            OCIBreak(bad, err_),
+            OCIReset(bad, err_),
+            OCIPasswordChange(svc, err_, buf, 2, buf, 2, buf, 2, 0),
+            OCIServerVersion(bad, err_, buf, 15, OCI_HTYPE_SVCCTX),
+            OCIServerVersion(server, err, buf, 15, OCI_HTYPE_SERVER)};
+        for (std::size_t call = 0; call < std::size(refused); ++call)
+            EXPECT_EQ(refused[call], OCI_INVALID_HANDLE) << call;
         EXPECT_EQ(FirstCode(err_), 0) << "no record";
     }
     EXPECT_EQ(OCIEnvCreate(nullptr, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_ERROR);
@@ -186,7 +198,8 @@ TEST_F(CallsTest, ErrorTextIsCutAndTerminatedInAnyBuffer) {
         std::string buffer(whole.size() + 8, 'x');
         sb4 code = 0;
         OraText state[6] = "-----";
-        const sword rc = OCIErrorGet(err_, 1, state, &code, reinterpret_cast<OraText*>(buffer.data()), size, OCI_HTYPE_ERROR);
+        const sword rc =
+            OCIErrorGet(err_, 1, state, &code, reinterpret_cast<OraText*>(buffer.data()), size, OCI_HTYPE_ERROR);
         EXPECT_EQ(rc, size > whole.size() ? OCI_SUCCESS : OCI_ERROR) << size;
         EXPECT_EQ(code, 3114);
         EXPECT_STREQ(reinterpret_cast<char*>(state), "66000");
@@ -198,7 +211,8 @@ TEST_F(CallsTest, ErrorTextIsCutAndTerminatedInAnyBuffer) {
     EXPECT_EQ(OCIErrorGet(err_, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
     EXPECT_EQ(OCIErrorGet(err_, 0, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
     EXPECT_EQ(OCIErrorGet(err_, 1, nullptr, nullptr, nullptr, 0, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Attribute<sb4>(err_, OCI_HTYPE_ERROR, OCI_ATTR_SQLCODE), 3114) << "asking about the handle keeps its records";
+    EXPECT_EQ(Attribute<sb4>(err_, OCI_HTYPE_ERROR, OCI_ATTR_SQLCODE), 3114)
+        << "asking about the handle keeps its records";
 }
 
 TEST_F(CallsTest, Utf16TextsBothWays) {
@@ -209,7 +223,8 @@ TEST_F(CallsTest, Utf16TextsBothWays) {
     const auto bytes = [](const std::u16string& text) { return static_cast<ub4>(text.size() * 2); };
     const auto text = [](const std::u16string& t) { return reinterpret_cast<const OraText*>(t.data()); };
     OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(OCILogon(env, err, &svc, text(user), bytes(user), text(user), bytes(user), text(database), bytes(database)), 0);
+    ASSERT_EQ(
+        OCILogon(env, err, &svc, text(user), bytes(user), text(user), bytes(user), text(database), bytes(database)), 0);
     EXPECT_TRUE(fs::exists(folder_ + "/wide.db"));
 
     OCISession* session = nullptr;
@@ -229,7 +244,8 @@ TEST_F(CallsTest, Utf16TextsBothWays) {
                           sizeof message, OCI_HTYPE_ERROR), OCI_SUCCESS);
     EXPECT_EQ(std::u16string(state), u"HY000");
     EXPECT_EQ(std::u16string(message).substr(0, 24), u"[KELP/CLIENT] ORA-24501:");
-    EXPECT_EQ(OCIErrorGet(err, 1, nullptr, nullptr, reinterpret_cast<OraText*>(message), 31, OCI_HTYPE_ERROR), OCI_ERROR);
+    EXPECT_EQ(OCIErrorGet(err, 1, nullptr, nullptr, reinterpret_cast<OraText*>(message), 31, OCI_HTYPE_ERROR),
+              OCI_ERROR);
     EXPECT_EQ(std::u16string(message), u"[KELP/CLIENT] ") << "whole units";
     EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
 }
@@ -269,11 +285,16 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
     EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 7)), 24310);
     EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, Text("ann"), 4294967295u, Text("secret"), 100, Text("test"), 9000)), 0)
         << "lengths beyond the ends of the texts";
-    const struct { ub4 mode; sb4 number; } modes[] = {{OCI_LOGON2_CPOOL, 24392}, {OCI_LOGON2_SPOOL, 24416}, {0x800, 24300}};
+    const struct {
+        ub4 mode;
+        sb4 number;
+    } modes[] = {{OCI_LOGON2_CPOOL, 24392}, {OCI_LOGON2_SPOOL, 24416}, {0x800, 24300}};
     for (const auto& c : modes) {
         EXPECT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 0, c.mode)), c.number) << c.mode;
     }
-    EXPECT_EQ(Answer(OCILogon2(env_, err_, &svc, Text("ann"), 3, Text("secret"), 6, Text("test"), 4, OCI_LOGON2_STMTCACHE)), 0);
+    EXPECT_EQ(
+        Answer(OCILogon2(env_, err_, &svc, Text("ann"), 3, Text("secret"), 6, Text("test"), 4, OCI_LOGON2_STMTCACHE)),
+        0);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
 }
 
@@ -320,7 +341,8 @@ TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {
     EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_SUCCESS);
     EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 3114) << "the context's server is gone";
     EXPECT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &server, nullptr, 4711, err_)), 24315);
-    EXPECT_EQ(Answer(OCIAttrGet(session, OCI_HTYPE_SESSION, &server, nullptr, OCI_ATTR_PASSWORD, err_)), 24315) << "write only";
+    EXPECT_EQ(Answer(OCIAttrGet(session, OCI_HTYPE_SESSION, &server, nullptr, OCI_ATTR_PASSWORD, err_)), 24315)
+        << "write only";
     EXPECT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, nullptr, nullptr, OCI_ATTR_ENV, err_)), 21560);
 }
 
@@ -398,7 +420,8 @@ TEST_F(CallsTest, MemoryThatFailsAtEachCallInTurn) {
         dvoid* handle = nullptr;
         dvoid* extra = nullptr;
         dvoid* array[3];
-        if (OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 8, &extra) != OCI_SUCCESS) return OCI_ERROR;
+        if (OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 8, &extra) != OCI_SUCCESS)
+            return OCI_ERROR;
         if (OCIHandleAlloc(env, &handle, OCI_HTYPE_SVCCTX, 8, &extra) != OCI_SUCCESS) return OCI_ERROR;
         if (OCIArrayDescriptorAlloc(env, array, OCI_DTYPE_LOB, 3, 8, &extra) != OCI_SUCCESS) return OCI_ERROR;
         OCISvcCtx* svc = nullptr;
@@ -412,8 +435,8 @@ TEST_F(CallsTest, MemoryThatFailsAtEachCallInTurn) {
         memory.fail_at = fail_at;
         OCIEnv* env = nullptr;
         dvoid* extra = nullptr;
-        rc = OCIEnvCreate(&env, OCI_DEFAULT, &memory, FailingMemory::Allocate, FailingMemory::Reallocate, FailingMemory::Free,
-                          16, &extra);
+        rc = OCIEnvCreate(&env, OCI_DEFAULT, &memory, FailingMemory::Allocate, FailingMemory::Reallocate,
+                          FailingMemory::Free, 16, &extra);
         if (rc == OCI_SUCCESS) {
             OCIError* err = nullptr;
             rc = use(env, err);
@@ -433,7 +456,8 @@ TEST_F(CallsTest, MemoryThatFailsAtEachCallInTurn) {
 
 TEST_F(CallsTest, InitializeServesEnvInit) {
     FailingMemory memory;
-    ASSERT_EQ(OCIInitialize(OCI_UTF16, &memory, FailingMemory::Allocate, FailingMemory::Reallocate, FailingMemory::Free), 0);
+    ASSERT_EQ(
+        OCIInitialize(OCI_UTF16, &memory, FailingMemory::Allocate, FailingMemory::Reallocate, FailingMemory::Free), 0);
     OCIEnv* env = nullptr;
     ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
     EXPECT_GT(memory.out, 0);
@@ -497,7 +521,9 @@ TEST_F(CallsTest, OneSessionInManyThreads) {
     sb8 count = 0;
     OCIDefine* define = nullptr;
     ASSERT_EQ(OCIStmtPrepare(stmt, err, Text("select count(*) from t"), 22, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
-    ASSERT_EQ(OCIDefineByPos(stmt, &define, err, 1, &count, sizeof count, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT), 0);
+    ASSERT_EQ(
+        OCIDefineByPos(stmt, &define, err, 1, &count, sizeof count, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT),
+        0);
     ASSERT_EQ(OCIStmtExecute(svc, stmt, err, 1, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
     EXPECT_EQ(count, 200);
     EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
@@ -514,10 +540,12 @@ TEST_F(CallsTest, HandlesFromManyThreads) {
             OCISvcCtx* svc = nullptr;
             wrong += OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr) != OCI_SUCCESS;
             const std::string file = folder_ + "/t" + std::to_string(number) + ".db";
-            wrong += OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(file.c_str()), Length(file.c_str())) != OCI_SUCCESS;
+            wrong += OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(file.c_str()), Length(file.c_str())) !=
+                     OCI_SUCCESS;
             std::vector<dvoid*> handles(600);
             for (int round = 0; round < 3; ++round) {
-                for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env, &handle, OCI_HTYPE_TRANS, 0, nullptr) != OCI_SUCCESS;
+                for (dvoid*& handle : handles)
+                    wrong += OCIHandleAlloc(env, &handle, OCI_HTYPE_TRANS, 0, nullptr) != OCI_SUCCESS;
                 for (dvoid*& handle : handles) wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_SUCCESS;
                 for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env, &handle, 99, 0, nullptr) != OCI_ERROR;
                 wrong += OCIPing(svc, err, 0) != OCI_SUCCESS;

@@ -118,7 +118,9 @@ protected:
         if (status.Failed()) return status.Number();
         return outcome.failures.empty() ? 0 : outcome.failures.front().status.Number();
     }
-    std::string Query(const std::string& sql, std::vector<Datum> values = {}) { return Query(*connection_, sql, values); }
+    std::string Query(const std::string& sql, std::vector<Datum> values = {}) {
+        return Query(*connection_, sql, values);
+    }
     // All rows: columns with ',', rows with ';' behind them.
     static std::string Query(engine::Connection& connection, const std::string& sql, std::vector<Datum> values = {}) {
         auto query = Prepare(connection, sql);
@@ -135,7 +137,8 @@ protected:
             const Status status = query.Fetch(values, more);
             if (status.Failed()) return text + "error " + std::to_string(status.Number());
             if (!more) return text;
-            for (std::size_t index = 0; index < values.size(); ++index) text += (index ? "," : "") + Shown(values[index]);
+            for (std::size_t index = 0; index < values.size(); ++index)
+                text += (index ? "," : "") + Shown(values[index]);
             text += ';';
         }
     }
@@ -193,21 +196,47 @@ TEST_F(EngineTest, ValuesComeBackAsTheirColumnsAreDeclared) {
 
 // The same value through a placeholder, as a literal, from a query and by an update.
 TEST_F(EngineTest, ColumnsTakeWhatTheirDeclarationSays) {
-    ASSERT_EQ(Run("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
-                  "s timestamp, r raw(2), x kelp_decfloat(16), b clob)"), 0);
-    const struct { const char* column; const char* literal; const char* outcome; } cases[] = {
-        {"n", "'12.345'", "real 12.35"}, {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"}, {"n", "-1000", "error 1438"},
-        {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"}, {"n", "''", "null"}, {"n", "1.005e2", "real 100.5"},
-        {"w", "12345", "12300"}, {"w", "99950", "error 1438"}, {"i", "2.5", "3"}, {"i", "' 12 '", "12"},
-        {"f", "'123456789012345678901234567890.5'", "decimal 123456789012345678901234567890.5"}, {"f", "1e300", "error 1426"},
-        {"v", "'abc'", "abc"}, {"v", "'abcd'", "error 12899"}, {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"}, {"v", "12", "12"},
-        {"c", "'ab  '", "ab  "}, {"c", "'abcde'", "error 12899"}, {"c", "'abcd   '", "abcd"},
-        {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"}, {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"},
-        {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"}, {"d", "'30-FEB-24'", "error 1839"}, {"d", "'x'", "error 1858"},
-        {"d", "5", "error 932"}, {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"},
-        {"r", "'0aFF'", "bytes 2"}, {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 2"},
-        {"x", "'1.23456789012345678'", "decimal 1.234567890123457"}, {"b", "'any text at all'", "any text at all"},
-        {"n", "null", "null"}};
+    ASSERT_EQ(
+        Run("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
+            "s timestamp, r raw(2), x kelp_decfloat(16), b clob)"),
+        0);
+    const struct { const char* column; const char* literal; const char* outcome;
+    } cases[] = {{"n", "'12.345'", "real 12.35"},
+                 {"n", "999.99", "real 999.99"},
+                 {"n", "999.995", "error 1438"},
+                 {"n", "-1000", "error 1438"},
+                 {"n", "'abc'", "error 1722"},
+                 {"n", "x'01'", "error 932"},
+                 {"n", "7", "7"},
+                 {"n", "''", "null"},
+                 {"n", "1.005e2", "real 100.5"},
+                 {"w", "12345", "12300"},
+                 {"w", "99950", "error 1438"},
+                 {"i", "2.5", "3"},
+                 {"i", "' 12 '", "12"},
+                 {"f", "'123456789012345678901234567890.5'", "decimal 123456789012345678901234567890.5"},
+                 {"f", "1e300", "error 1426"},
+                 {"v", "'abc'", "abc"},
+                 {"v", "'abcd'", "error 12899"},
+                 {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"},
+                 {"v", "12", "12"},
+                 {"c", "'ab  '", "ab  "},
+                 {"c", "'abcde'", "error 12899"},
+                 {"c", "'abcd   '", "abcd"},
+                 {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"},
+                 {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"},
+                 {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"},
+                 {"d", "'30-FEB-24'", "error 1839"},
+                 {"d", "'x'", "error 1858"},
+                 {"d", "5", "error 932"},
+                 {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"},
+                 {"r", "'0aFF'", "bytes 2"},
+                 {"r", "'0aFF00'", "error 12899"},
+                 {"r", "'0g'", "error 1465"},
+                 {"r", "x'0102'", "bytes 2"},
+                 {"x", "'1.23456789012345678'", "decimal 1.234567890123457"},
+                 {"b", "'any text at all'", "any text at all"},
+                 {"n", "null", "null"}};
     for (const auto& c : cases) {
         const std::string column = c.column;
         const std::string literal = c.literal;
@@ -222,9 +251,11 @@ TEST_F(EngineTest, ColumnsTakeWhatTheirDeclarationSays) {
         fresh("select 1");
         EXPECT_EQ(outcome(Run("insert into main.t(" + column + ") values(" + literal + ")")), want) << literal;
         fresh("select 1");
-        EXPECT_EQ(outcome(Run("insert into t(" + column + ") select " + literal + " where 1 = 1")), want) << "query " << literal;
+        EXPECT_EQ(outcome(Run("insert into t(" + column + ") select " + literal + " where 1 = 1")), want)
+            << "query " << literal;
         fresh("insert into t(n) values(null)");
-        EXPECT_EQ(outcome(Run("update t set r = null, " + column + " = " + literal + " where 1 = 1")), want) << "update " << literal;
+        EXPECT_EQ(outcome(Run("update t set r = null, " + column + " = " + literal + " where 1 = 1")), want)
+            << "update " << literal;
         if (literal.front() != '\'') continue;
         fresh("select 1");
         Rows rows{{Text(std::string_view(literal).substr(1, literal.size() - 2))}};
@@ -240,14 +271,21 @@ TEST_F(EngineTest, ColumnsAreDescribed) {
     const auto query = Prepare("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
                                "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', count(kelp_date(b )) from t");
     struct Expected { const char* name; int type; unsigned size; int precision; int scale; bool nullable; };
-    const Expected expected[] = {
-        {"A", SQLT_NUM, 22, 12, 2, false},   {"Mixed", SQLT_CHR, 20, 0, 0, true},  {"C", SQLT_AFC, 5, 0, 0, true},
-        {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true}, {"E", SQLT_NUM, 22, 0, -127, true}, {"F", SQLT_CLOB, 4000, 0, 0, true},
-        {"G", SQLT_CHR, 0, 0, 0, true},      {"ID", SQLT_NUM, 22, 38, 0, false},   {"H", SQLT_BDOUBLE, 16, 34, -127, true},
-        {"I", SQLT_NUM, 22, 5, 0, true},     {"1+1", SQLT_CHR, 0, 0, 0, true},     {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true},
-        {"ID", SQLT_RDD, 18, 0, 0, false},
-        {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
-        {"COUNT(CAST(B AS DATE))", SQLT_CHR, 0, 0, 0, true}};
+    const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false},
+                                 {"Mixed", SQLT_CHR, 20, 0, 0, true},
+                                 {"C", SQLT_AFC, 5, 0, 0, true},
+                                 {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true},
+                                 {"E", SQLT_NUM, 22, 0, -127, true},
+                                 {"F", SQLT_CLOB, 4000, 0, 0, true},
+                                 {"G", SQLT_CHR, 0, 0, 0, true},
+                                 {"ID", SQLT_NUM, 22, 38, 0, false},
+                                 {"H", SQLT_BDOUBLE, 16, 34, -127, true},
+                                 {"I", SQLT_NUM, 22, 5, 0, true},
+                                 {"1+1", SQLT_CHR, 0, 0, 0, true},
+                                 {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true},
+                                 {"ID", SQLT_RDD, 18, 0, 0, false},
+                                 {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
+                                 {"COUNT(CAST(B AS DATE))", SQLT_CHR, 0, 0, 0, true}};
     const auto& columns = query->Columns();
     ASSERT_EQ(columns.size(), std::size(expected));
     for (std::size_t index = 0; index < columns.size(); ++index) {
@@ -301,7 +339,8 @@ TEST_F(EngineTest, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
 }
 
 TEST_F(EngineTest, ErrorsHaveTheirNumbers) {
-    ASSERT_EQ(Run("create table p(id integer primary key, n number not null, u varchar2(9) unique, check (n < 100))"), 0);
+    ASSERT_EQ(Run("create table p(id integer primary key, n number not null, u varchar2(9) unique, check (n < 100))"),
+              0);
     ASSERT_EQ(Run("create table c(p integer references p(id))"), 0);
     ASSERT_EQ(Run("create table late(p integer references p(id) deferrable initially deferred)"), 0);
     ASSERT_EQ(Run("insert into p values(1, 1, 'a')"), 0);

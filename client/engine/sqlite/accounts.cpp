@@ -52,8 +52,8 @@ bool Matches(const std::string& password, const std::string& hash) {
 }
 
 // Runs a statement with up to two texts bound; `answer` takes the first column of the first row, if there is one.
-Status Run(SqliteConnection& connection, const char* sql, std::initializer_list<std::string_view> texts, std::string* answer,
-           bool* found) {
+Status Run(SqliteConnection& connection, const char* sql, std::initializer_list<std::string_view> texts,
+           std::string* answer, bool* found) {
     sqlite3* database = connection.Database();
     sqlite3_stmt* compiled = nullptr;
     int code = sqlite3_prepare_v2(database, sql, -1, &compiled, nullptr);

@@ -1,5 +1,5 @@
-// Accounts of an embedded database: a table of it, with passwords hashed by the system's crypt. The first named logon of a
-// database without accounts makes its owner's.
+// Accounts of an embedded database: a table of it, with passwords hashed by the system's crypt. The first named logon
+// of a database without accounts makes its owner's.
 #pragma once
 
 #include <string>

@@ -69,7 +69,9 @@ private:
         std::string text;
     };
 
-    bool Is(std::size_t index, std::string_view word) const { return index < pieces_.size() && IsWord(pieces_[index], word); }
+    bool Is(std::size_t index, std::string_view word) const {
+        return index < pieces_.size() && IsWord(pieces_[index], word);
+    }
     std::size_t Begin(std::size_t index) const { return static_cast<std::size_t>(pieces_[index].data() - sql_.data()); }
     std::size_t End(std::size_t index) const { return Begin(index) + pieces_[index].size(); }
 
@@ -80,7 +82,8 @@ private:
             if (pieces_[index] == "(") ++depth;
             if (pieces_[index] == ")" && --depth < 0) return index;
             if (depth != 0) continue;
-            if (std::any_of(words.begin(), words.end(), [&](std::string_view word) { return Is(index, word); })) return index;
+            const bool found = std::any_of(words.begin(), words.end(), [&](auto word) { return Is(index, word); });
+            if (found) return index;
         }
         return pieces_.size();
     }
@@ -141,7 +144,8 @@ private:
         }
     }
 
-    // insert into t <query> becomes with kelp_source(c1, ...) as (<query>) insert into t select kelp_store(c1, ...), ...
+    // insert into t <query> becomes
+    // with kelp_source(c1, ...) as (<query>) insert into t select kelp_store(c1, ...), ... from kelp_source
     void InsertQuery(std::size_t at, const std::vector<const TableColumn*>& targets) {
         const bool concerned = std::any_of(targets.begin(), targets.end(),
                                            [](const TableColumn* target) { return target && target->concerned; });
@@ -161,7 +165,8 @@ private:
 
     static std::string Stored(const std::string& expression, const TableColumn* target) {
         if (!target || !target->concerned) return expression;
-        return "kelp_store(" + expression + ", " + Literal(target->declared) + ", " + Literal(target->column.name) + ")";
+        const std::string& name = target->column.name;
+        return "kelp_store(" + expression + ", " + Literal(target->declared) + ", " + Literal(name) + ")";
     }
 
     static std::string Literal(std::string_view text) {
@@ -206,7 +211,8 @@ private:
     bool IsLongNumber(Span span) const {
         const std::string_view text = sql_.substr(Begin(span.first), End(span.last - 1) - Begin(span.first));
         const auto digits = std::count_if(text.begin(), text.end(), [](unsigned char c) { return std::isdigit(c); });
-        return digits > kExactDigits && text.find_first_not_of("0123456789.", text[0] == '-' ? 1 : 0) == std::string_view::npos;
+        return digits > kExactDigits &&
+               text.find_first_not_of("0123456789.", text[0] == '-' ? 1 : 0) == std::string_view::npos;
     }
 
     // A null, and a plain number for a column of numbers without limits.

@@ -109,7 +109,8 @@ bool Coercion::Concerns(const Column& column) {
 
 Status Coercion::Apply(Datum& value) {
     if (value.kind == Kind::null) return {};
-    if (IsNumberType(column_.type) || column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) return ApplyNumber(value);
+    const bool is_binary_float = column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE;
+    if (is_binary_float || IsNumberType(column_.type)) return ApplyNumber(value);
     if (IsDateType(column_.type)) return ApplyDate(value);
     if (column_.type == SQLT_BIN) return ApplyBytes(value);
     return ApplyText(value);

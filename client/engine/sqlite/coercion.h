@@ -1,5 +1,5 @@
-// What a column's declaration makes of a value that is stored into it: numbers from text, rounded to the scale; dates from
-// text; texts and bytes that must fit. SQLite itself stores anything anywhere.
+// What a column's declaration makes of a value that is stored into it: numbers from text, rounded to the scale; dates
+// from text; texts and bytes that must fit. SQLite itself stores anything anywhere.
 #pragma once
 
 #include <array>

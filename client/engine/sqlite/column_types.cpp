@@ -138,7 +138,9 @@ void Apply(Measure measure, const std::string& normal, Column& column) {
             column.precision = static_cast<std::uint8_t>(std::clamp(numbers[0], 0, 38));
             column.scale = static_cast<std::int8_t>(count > 1 ? std::clamp(numbers[1], -84, 127) : 0);
             break;
-        case Measure::binary_digits: column.precision = static_cast<std::uint8_t>(std::clamp(numbers[0], 0, 126)); break;
+        case Measure::binary_digits:
+            column.precision = static_cast<std::uint8_t>(std::clamp(numbers[0], 0, 126));
+            break;
         case Measure::fraction: column.scale = static_cast<std::int8_t>(std::clamp(numbers[0], 0, 9)); break;
     }
 }

@@ -1,4 +1,4 @@
-// Declared types: what a column's declaration says about its values. SQLite keeps the words and looks at little of them.
+// Declared types: what a column's declaration says about its values. SQLite keeps the words and little more.
 #pragma once
 
 #include <string_view>

@@ -115,8 +115,8 @@ Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& q
 StatementHandle SqliteConnection::Compile(std::string_view sql, int& code, std::size_t* end) {
     sqlite3_stmt* compiled = nullptr;
     const char* rest = nullptr;
-    code = sqlite3_prepare_v3(database_.get(), sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT, &compiled,
-                              &rest);
+    code = sqlite3_prepare_v3(database_.get(), sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
+                              &compiled, &rest);
     if (end && rest) *end = static_cast<std::size_t>(rest - sql.data());
     return StatementHandle(compiled);
 }

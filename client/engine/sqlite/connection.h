@@ -34,7 +34,8 @@ public:
     Status Prime();
 
     Status Authenticate(const Credentials& credentials) override;
-    Status ChangePassword(const std::string& user, const std::string& old_password, const std::string& new_password) override;
+    Status ChangePassword(const std::string& user, const std::string& old_password,
+                          const std::string& new_password) override;
     Status Prepare(std::string_view sql, std::unique_ptr<Query>& query, std::uint32_t& error_offset) override;
     Status Begin() override;
     Status Commit() override;

@@ -84,8 +84,8 @@ bool IsNullable(sqlite3* database, sqlite3_stmt* statement, int index) {
     if (!table || !origin) return true;
     int not_null = 0;
     int primary_key = 0;
-    sqlite3_table_column_metadata(database, sqlite3_column_database_name(statement, index), table, origin, nullptr, nullptr,
-                                  &not_null, &primary_key, nullptr);
+    sqlite3_table_column_metadata(database, sqlite3_column_database_name(statement, index), table, origin, nullptr,
+                                  nullptr, &not_null, &primary_key, nullptr);
     return not_null == 0 && primary_key == 0;
 }
 

@@ -92,11 +92,12 @@ int CountMismatch(std::string_view message) {
     int values = 0;
     const std::string text(message);
     const std::size_t has = text.rfind(" has ");
-    if (has != std::string::npos && std::sscanf(text.c_str() + has, " has %d columns but %d values", &columns, &values) == 2) {
+    if (has != std::string::npos &&
+        std::sscanf(text.c_str() + has, " has %d columns but %d values", &columns, &values) == 2) {
         return values < columns ? 947 : 913;
     }
-    if (std::sscanf(text.c_str(), "%d values for %d columns", &values, &columns) == 2) return values < columns ? 947 : 913;
-    return 0;
+    const bool told = std::sscanf(text.c_str(), "%d values for %d columns", &values, &columns) == 2;
+    return !told ? 0 : values < columns ? 947 : 913;
 }
 
 int NumberOfWords(std::string_view message) {
@@ -119,7 +120,8 @@ int NumberOf(int code, Verb verb, std::string_view message) {
 // "number detail", from a function of our own.
 Status ToldByFunction(std::string_view words) {
     const std::size_t blank = words.find(' ');
-    return Error(std::atoi(std::string(words.substr(0, blank)).c_str()), std::string(words.substr(blank + 1))).From("SQLITE");
+    return Error(std::atoi(std::string(words.substr(0, blank)).c_str()), std::string(words.substr(blank + 1)))
+        .From("SQLITE");
 }
 
 }  // namespace

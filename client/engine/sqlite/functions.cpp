@@ -56,7 +56,8 @@ void ReturnNumber(sqlite3_context* context, const OCINumber& number) {
     switch (stored.form) {
         case StoredNumber::Form::integer: return sqlite3_result_int64(context, stored.integer);
         case StoredNumber::Form::real: return sqlite3_result_double(context, stored.real);
-        case StoredNumber::Form::blob: return sqlite3_result_blob(context, stored.blob, stored.length, SQLITE_TRANSIENT);
+        case StoredNumber::Form::blob:
+            return sqlite3_result_blob(context, stored.blob, stored.length, SQLITE_TRANSIENT);
         case StoredNumber::Form::null: return sqlite3_result_null(context);
     }
 }
@@ -75,8 +76,9 @@ Datum ReadDatum(sqlite3_value* value, OCINumber& number) {
             break;
         case SQLITE_TEXT: SetBytes(datum, Kind::text, bytes); break;
         case SQLITE_BLOB:
-            if (ReadNumberBlob(bytes, number)) SetBytes(datum, Kind::decimal, {reinterpret_cast<char*>(&number), sizeof number});
-            else SetBytes(datum, Kind::bytes, bytes);
+            SetBytes(datum, Kind::bytes, bytes);
+            if (!ReadNumberBlob(bytes, number)) break;
+            SetBytes(datum, Kind::decimal, {reinterpret_cast<char*>(&number), sizeof number});
             break;
         default: break;
     }
@@ -90,9 +92,10 @@ void ReturnDatum(sqlite3_context* context, const Datum& datum) {
         case Kind::decimal: return ReturnNumber(context, *static_cast<const OCINumber*>(datum.data));
         case Kind::text:
         case Kind::timestamp:
-            return sqlite3_result_text64(context, datum.length ? datum.Text().data() : "", datum.length, SQLITE_TRANSIENT,
-                                         SQLITE_UTF8);
-        case Kind::bytes: return sqlite3_result_blob64(context, datum.length ? datum.data : "", datum.length, SQLITE_TRANSIENT);
+            return sqlite3_result_text64(context, datum.length ? datum.Text().data() : "", datum.length,
+                                         SQLITE_TRANSIENT, SQLITE_UTF8);
+        case Kind::bytes:
+            return sqlite3_result_blob64(context, datum.length ? datum.data : "", datum.length, SQLITE_TRANSIENT);
         default: return sqlite3_result_null(context);
     }
 }

@@ -7,8 +7,8 @@
 
 namespace engine::sqlite {
 
-// Casts by functions that keep every digit of a number and the text form of dates. Of two types that begin with the same
-// word the longer stands first.
+// Casts by functions that keep every digit of a number and the text form of dates. Of two types that begin with the
+// same word the longer stands first.
 inline constexpr Dialect::Spelling kCasts[] = {
     {"decfloat", "kelp_decfloat"},
     {"number", "kelp_number"},

@@ -20,9 +20,14 @@ int Length(const Datum& value) { return static_cast<int>(value.length); }
 }  // namespace
 
 SqliteQuery::SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql)
-    : connection_(connection), statement_(std::move(statement)), sql_(sql), verb_(VerbOf(sql_)),
-      changes_rows_(verb_ != Verb::other), read_only_(sqlite3_stmt_readonly(statement_.get()) != 0),
-      parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))), coercions_(parameters_.size()) {}
+    : connection_(connection),
+      statement_(std::move(statement)),
+      sql_(sql),
+      verb_(VerbOf(sql_)),
+      changes_rows_(verb_ != Verb::other),
+      read_only_(sqlite3_stmt_readonly(statement_.get()) != 0),
+      parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))),
+      coercions_(parameters_.size()) {}
 
 SqliteQuery::~SqliteQuery() { Close(); }
 
@@ -41,17 +46,22 @@ const std::vector<Column>& SqliteQuery::Columns() {
     return columns_;
 }
 
-// From the types, once: what Fill does for each column.
+SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
+    if (IsNumberType(column.type)) return Reading::number;
+    if (IsDateType(column.type)) return Reading::date;
+    switch (column.type) {
+        case SQLT_RDD: return Reading::row_id;
+        case SQLT_AFC: return column.size > 0 ? Reading::padded : Reading::as_stored;
+        case SQLT_BIN:
+        case SQLT_LBI:
+        case SQLT_BLOB: return Reading::bytes;
+        default: return Reading::as_stored;
+    }
+}
+
 void SqliteQuery::PlanReading() {
     readings_.clear();
-    for (const Column& column : columns_) {
-        if (IsNumberType(column.type)) readings_.push_back(Reading::number);
-        else if (IsDateType(column.type)) readings_.push_back(Reading::date);
-        else if (column.type == SQLT_RDD) readings_.push_back(Reading::row_id);
-        else if (column.type == SQLT_AFC && column.size > 0) readings_.push_back(Reading::padded);
-        else if (column.type == SQLT_BIN || column.type == SQLT_BLOB || column.type == SQLT_LBI) readings_.push_back(Reading::bytes);
-        else readings_.push_back(Reading::as_stored);
-    }
+    for (const Column& column : columns_) readings_.push_back(ReadingOf(column));
     numbers_.resize(columns_.size());
     padded_.resize(columns_.size());
 }

@@ -54,6 +54,7 @@ private:
     Status Stopped(int code);
     void Fill(std::span<Datum> values);
     void Pad(std::size_t column, Datum& value);
+    static Reading ReadingOf(const Column& column);
     void PlanReading();
     void DescribeFromRow();
 

@@ -1,5 +1,5 @@
-// Rows read ahead: what is left of an open query before its connection writes, so that the query goes on showing what it
-// was opened on. Up to 32 MB stay in memory, what is beyond lies in a temporary file until it is read.
+// Rows read ahead: what is left of an open query before its connection writes, so that the query goes on showing what
+// it was opened on. Up to 32 MB stay in memory, what is beyond lies in a temporary file until it is read.
 #pragma once
 
 #include <cstddef>

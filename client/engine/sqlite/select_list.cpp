@@ -22,8 +22,9 @@ bool ClosesLast(const std::vector<std::string_view>& pieces, std::size_t open) {
 // cast(e as T(a, b)), or F(e, a, b) of a function that casts.
 std::string CastType(const std::vector<std::string_view>& pieces) {
     if (pieces.size() < 4 || pieces[1] != "(" || !ClosesLast(pieces, 1)) return {};
-    const auto* cast = std::find_if(std::begin(kCasts), std::end(kCasts),
-                                    [&](const Dialect::Spelling& spelling) { return IsWord(pieces[0], spelling.engine); });
+    const auto* cast = std::find_if(std::begin(kCasts), std::end(kCasts), [&](const Dialect::Spelling& spelling) {
+        return IsWord(pieces[0], spelling.engine);
+    });
     const bool by_function = cast != std::end(kCasts);
     if (!by_function && !IsWord(pieces[0], "cast")) return {};
     int depth = 0;
@@ -54,7 +55,8 @@ bool EndsList(std::string_view piece) {
     constexpr std::array<std::string_view, 9> kClauses = {"from", "where", "union", "order", "limit", "group",
                                                           "except", "intersect", "window"};
     return piece.empty() || piece == ";" || piece == ")" ||
-           std::any_of(kClauses.begin(), kClauses.end(), [&](std::string_view clause) { return IsWord(piece, clause); });
+           std::any_of(kClauses.begin(), kClauses.end(),
+                       [&](std::string_view clause) { return IsWord(piece, clause); });
 }
 
 }  // namespace
@@ -79,7 +81,8 @@ std::vector<SelectItem> ReadSelectList(std::string_view sql) {
             begin = pieces.At();
         } else if (piece.empty()) {
             return {};
-        } else if (piece == "*" && depth == 0 && sql.substr(begin, end - begin).find_first_not_of(" \t\r\n") == std::string_view::npos) {
+        } else if (piece == "*" && depth == 0 &&
+                   sql.substr(begin, end - begin).find_first_not_of(" \t\r\n") == std::string_view::npos) {
             return {};
         } else if (piece == "(") {
             ++depth;
