@@ -14,7 +14,8 @@
 
 namespace {
 
-// The statement that a buffer belongs to. False when the command ends: an unknown name, which has been complained about.
+// The statement that a buffer belongs to. False when the command ends: an unknown name, which has been complained
+// about.
 bool ResolveStatement(const char* word, void*& statement) {
     statement = IsInvalid(word) ? InvalidObject() : nullptr;
     if (statement != nullptr || FindObject(Kind::stmt, word, statement) || IsNull(word)) return true;
@@ -22,7 +23,7 @@ bool ResolveStatement(const char* word, void*& statement) {
     return false;
 }
 
-// --- Making and freeing -----------------------------------------------------------------------------------------------
+// --- Making and freeing --------------------------------------------------------------------------------------------
 
 // What a buffer's words ask for.
 struct Request {
@@ -84,7 +85,7 @@ void FreeBuffer(int, char** words) {
     Message(kOutput, "FreeMemOCI: memory buffer %s freed.\n", words[1]);
 }
 
-// --- Changing ---------------------------------------------------------------------------------------------------------
+// --- Changing ------------------------------------------------------------------------------------------------------
 
 void UpdateElement(int, char** words) {
     MemBuffer* buffer = FindBuffer(words[1]);
@@ -137,7 +138,7 @@ void UpdateField(int, char** words) {
     Message(kOutput, "memhandle %s updated\n", words[1]);
 }
 
-// --- Listing ----------------------------------------------------------------------------------------------------------
+// --- Listing -------------------------------------------------------------------------------------------------------
 
 void ListBuffers(int count, char** words) {
     void* statement = nullptr;
@@ -163,7 +164,8 @@ constexpr PlainCommand kBufferCommands[] = {
     {{320, Words(2, 3, 4), "ListOCI hstmt [hmembuf [in | out]]"}, ListBuffers},
     {{325, Words(5), "UpdateMemOCI memhandle elem value len"}, UpdateElement},
     {{361, Words(4),
-      "UpdateBuffer memhandle { CTYPE type | pinfo null | cbInfo value | pNullInd null | pcbValue null | prcode null  }"},
+      "UpdateBuffer memhandle "
+      "{ CTYPE type | pinfo null | cbInfo value | pNullInd null | pcbValue null | prcode null  }"},
      UpdateField},
 };
 

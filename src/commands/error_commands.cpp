@@ -34,11 +34,13 @@ struct Record {
     std::vector<char> text;
     bool has_state = true, has_code = true, has_text = true;
 
-    // The library is told the size that the script has typed. The room is larger where that is beyond what a text needs.
+    // The library is told the size that the script has typed. The room is larger where that is beyond what a text
+    // needs.
     explicit Record(int typed_size) : text(Room(typed_size)) {}
     static size_t Room(int typed_size) {
         constexpr int kLongestText = 1 << 20;
-        return static_cast<size_t>(typed_size < 0 ? kLongestText : std::clamp<int>(typed_size, kDiagnosticSize, kLongestText));
+        if (typed_size < 0) return kLongestText;
+        return static_cast<size_t>(std::clamp<int>(typed_size, kDiagnosticSize, kLongestText));
     }
     void Print() const;
 

@@ -3,8 +3,8 @@
 #include <cctype>
 #include <cstring>
 
-// Order matters: a typed word is the first command that it begins, so `o` is opt, `ocil` ocilogoff, and ocilogon must stand
-// before ocilogon2.
+// Order matters: a typed word is the first command that it begins, so `o` is opt, `ocil` ocilogoff, and ocilogon must
+// stand before ocilogon2.
 constexpr Command kCommandTable[] = {
     {"exit", 76}, {"quit", 76}, {"opt", 50}, {"read", 77}, {"ocienvcreate", 200}, {"xaoenv", 368}, {"xaosvcctx", 369},
     {"xaosterr", 376}, {"quickconnectoci", 350}, {"killenvoci", 351}, {"fetchalloci", 352}, {"ocienvinit", 201},

@@ -9,8 +9,8 @@
 // "DecodeKeyword(): Null length token.\n" and finds nothing.
 int DecodeKeyword(const char* word, const KeywordTable* table);
 
-// The OR of the values of the words joined by "|"; blanks are ignored. A piece that matches nothing prints a warning and
-// adds nothing.
+// The OR of the values of the words joined by "|"; blanks are ignored. A piece that matches nothing prints a warning
+// and adds nothing.
 int DecodeBitmask(const char* word, const KeywordTable* table);
 
 // As above; a word of which nothing matched is read as a decimal number (a bitmask has warned by then).

@@ -6,8 +6,8 @@
 inline constexpr size_t kLineSize = 10000;  // of the line buffer and of every token buffer
 inline constexpr int kTokenSlots = 1024;
 
-// The words of one reading level. A slot gets its buffer of kLineSize bytes when it is first used and keeps it, and what
-// it held, for later lines. A slot that could not get one holds an empty word.
+// The words of one reading level. A slot gets its buffer of kLineSize bytes when it is first used and keeps it, and
+// what it held, for later lines. A slot that could not get one holds an empty word.
 class TokenVector {
 public:
     TokenVector();

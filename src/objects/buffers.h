@@ -1,14 +1,14 @@
 // Memory buffers: named arrays of elements of one external data type, with an indicator, a length and a return code for
-// each element. Binds and defines hand their addresses to the library; the listing shows what it wrote there. The blocks
-// are the buffer's own; the pointers "for calls" are what commands pass on, and a script may set them to null.
+// each element. Binds and defines hand their addresses to the library; the listing shows what it wrote there. The
+// blocks are the buffer's own; the pointers "for calls" are what commands pass on, and a script may set them to null.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 #include <span>
 
-// What a data block has behind its last element, so that a value of any fixed size may be read or written at any element
-// even after a script has changed the type.
+// What a data block has behind its last element, so that a value of any fixed size may be read or written at any
+// element even after a script has changed the type.
 inline constexpr size_t kElementSlack = 64;
 
 struct MemBuffer {

@@ -1,6 +1,7 @@
 // Named objects: for each kind a fixed table from the name a script gives to the pointer the library returned.
-// Tables are searched from slot 0, so the lowest free slot is filled first. Names are cut to the slot's width before they
-// are stored or compared, and are unique within a kind only. Used by the command thread only; nothing here locks.
+// Tables are searched from slot 0, so the lowest free slot is filled first. Names are cut to the slot's width before
+// they are stored or compared, and are unique within a kind only. Used by the command thread only; nothing here
+// locks.
 #pragma once
 
 #include <cstddef>
@@ -42,7 +43,7 @@ struct NamedObject {
 // A deliberately bad object: a static, writable 15-byte text "Invalid buffer".
 void* InvalidObject();
 
-// --- Looking up -------------------------------------------------------------------------------------------------------
+// --- Looking up ----------------------------------------------------------------------------------------------------
 
 // The pointer an argument stands for: "invalid" the bad object, "null" a null pointer; an unknown name prints
 // "Handle %s not found\n" and gives a null pointer, with which the call is made all the same. Names of descriptors may
@@ -77,7 +78,7 @@ NamedObject* FindByPointer(Kind kind, const void* object);
 // All slots of the kind, free ones included; none for kinds with records of their own.
 std::span<NamedObject> SlotsOf(Kind kind);
 
-// --- Making and freeing -----------------------------------------------------------------------------------------------
+// --- Making and freeing --------------------------------------------------------------------------------------------
 
 // Null for "-1" and "null": the library gets a null output location and nothing is registered. Else the word itself.
 const char* OutputName(const char* word);
@@ -85,8 +86,8 @@ const char* OutputName(const char* word);
 // Whether the name is taken; prints the kind's message if so.
 bool CheckInUse(Kind kind, const char* name);
 
-// Fills the first free slot after a successful call. "null" and "invalid" print "Variable name NULL not allowed\n", a full
-// table its overflow message; both give null.
+// Fills the first free slot after a successful call. "null" and "invalid" print "Variable name NULL not allowed\n", a
+// full table its overflow message; both give null.
 NamedObject* Register(Kind kind, const char* name, void* object, void* parent);
 
 // Frees the first slot of that name after a successful call; "Handle %s not found\n" when there is none.
@@ -96,7 +97,7 @@ void Release(Kind kind, const char* name);
 std::optional<Kind> KindOfHandleType(int type);
 std::optional<Kind> KindOfDescriptorType(int type);
 
-// --- For kinds with records of their own ------------------------------------------------------------------------------
+// --- For kinds with records of their own ---------------------------------------------------------------------------
 // A record has at least `in_use` and a character array `name`.
 
 // Whether the slot's name is the word, cut to the slot's width.

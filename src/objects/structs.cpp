@@ -10,8 +10,13 @@ namespace {
 MemStruct structs[256];
 
 DataTarget TargetOf(MemBuffer& buffer) {
-    return {buffer.call_data,         buffer.call_length,       buffer.type, buffer.call_indicators, buffer.call_lengths,
-            buffer.call_return_codes, &buffer.current_element};
+    return {buffer.call_data,
+            buffer.call_length,
+            buffer.type,
+            buffer.call_indicators,
+            buffer.call_lengths,
+            buffer.call_return_codes,
+            &buffer.current_element};
 }
 
 DataTarget TargetOf(MemStruct& record, StructMember& member) {

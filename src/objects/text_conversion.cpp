@@ -33,8 +33,8 @@ int FromUtf16(const void* text, size_t length, std::string& output) {
     if (text == nullptr || length == 0) return 0;
     output.resize(2 * length + 1);
     size_t unused = 0;
-    const int rc = CodePageConvert(kCodePageUtf16, EffectiveCodePage(), text, length, nullptr, output.data(), output.size(),
-                                   &unused);
+    const int rc = CodePageConvert(kCodePageUtf16, EffectiveCodePage(), text, length, nullptr, output.data(),
+                                   output.size(), &unused);
     output.resize(IsTolerated(rc) ? output.size() - std::min(unused, output.size()) : 0);
     return rc;
 }
@@ -88,7 +88,8 @@ int convertToUTF16(const char* input, uint32_t input_length, char* output, uint3
         return 0;
     }
     size_t unused = 0;
-    const int rc = CodePageConvert(EffectiveCodePage(), kCodePageUtf16, input, input_length, nullptr, output, capacity, &unused);
+    const int rc = CodePageConvert(EffectiveCodePage(), kCodePageUtf16, input, input_length, nullptr, output, capacity,
+                                   &unused);
     if (!IsTolerated(rc)) {
         Message(kError, "CodePageConvert failed with rc - %ld\n", static_cast<long>(rc));
         return rc;
@@ -130,7 +131,7 @@ bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16) {
     return true;
 }
 
-// --- Text arguments ---------------------------------------------------------------------------------------------------
+// --- Text arguments ------------------------------------------------------------------------------------------------
 
 bool TextArgument::Set(const char* word, long length, TextArea area) {
     text_ = nullptr;

@@ -9,8 +9,8 @@
 #include "core/messages.h"
 #include "objects/memory.h"
 
-// Converts a text argument. Returns 0 (or a tolerated warning of the code-page service), -1 for a bad argument, else the
-// service's code; says so by its messages. Lengths and capacity in bytes. A word W'...' is copied, not converted.
+// Converts a text argument. Returns 0 (or a tolerated warning of the code-page service), -1 for a bad argument, else
+// the service's code; says so by its messages. Lengths and capacity in bytes. A word W'...' is copied, not converted.
 int convertToUTF16(const char* input, uint32_t input_length, char* output, uint32_t capacity, uint32_t* output_length,
                    bool quiet = false);
 
@@ -23,8 +23,8 @@ bool convertFromUTF16(const void* text, size_t length, std::string& output);
 // The bytes of a UTF-16 text before its first zero pair, looking no further than `limit` bytes.
 size_t Utf16Length(const void* text, size_t limit);
 
-// Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". After a failed conversion the
-// line is printed as far as it goes, the failure after it, and false returned.
+// Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". After a failed conversion
+// the line is printed as far as it goes, the failure after it, and false returned.
 bool AddText(Line& line, const void* text, size_t length, bool utf16);
 // The same without W"..." around what was converted.
 bool AddPlainText(Line& line, const void* text, size_t length, bool utf16);
@@ -45,8 +45,8 @@ public:
     static constexpr uint32_t kTokenBufferSize = 10000;  // what may be read at a word, whatever its length
     static constexpr uint32_t kReadableText = 256u << 20;
 
-    // Texts beside "null" that stand for a null pointer are for the caller to say: pass a null word then. False when the
-    // command ends here (no memory, failed conversion): the message has been printed.
+    // Texts beside "null" that stand for a null pointer are for the caller to say: pass a null word then. False when
+    // the command ends here (no memory, failed conversion): the message has been printed.
     bool Set(const char* word, long length, TextArea area);
     // Bytes rather than a text: never converted, and "null" is no reserved word. A null word passes a null pointer.
     bool SetBytes(const char* word, long length);

@@ -22,8 +22,8 @@
 
 namespace {
 
-// What a script has given for the element. Characters and bytes are taken as the length says; types of a fixed size take
-// the whole word.
+// What a script has given for the element. Characters and bytes are taken as the length says; types of a fixed size
+// take the whole word.
 struct Value {
     const char* word;
     std::string text;  // as many bytes of the word as the length says, converted where the type takes characters
@@ -33,7 +33,7 @@ struct Value {
 using Stored = std::optional<uint32_t>;
 using Assign = Stored (*)(const ElementTarget& target, const Value& value);
 
-// --- Characters and bytes ---------------------------------------------------------------------------------------------
+// --- Characters and bytes ------------------------------------------------------------------------------------------
 
 uint32_t CharacterSize() {
     return Utf16Mode ? 2 : 1;
@@ -62,7 +62,8 @@ Stored AssignTerminated(const ElementTarget& target, const Value& value) {
 Stored AssignPadded(const ElementTarget& target, const Value& value) {
     const uint32_t unit = CharacterSize();
     const uint32_t count = Copy(target, 0, value.text, target.size, unit);
-    for (uint32_t index = count; index < target.size; ++index) target.data[index] = (index - count) % unit == 0 ? ' ' : 0;
+    for (uint32_t index = count; index < target.size; ++index)
+        target.data[index] = (index - count) % unit == 0 ? ' ' : 0;
     return target.size;
 }
 
@@ -116,7 +117,7 @@ Stored AssignRowidBytes(const ElementTarget& target, const Value& value) {
     return Copy(target, 0, value.text, target.size);
 }
 
-// --- Library strings and raws -----------------------------------------------------------------------------------------
+// --- Library strings and raws --------------------------------------------------------------------------------------
 
 constexpr uint32_t kPointerLength = 8;
 
@@ -140,7 +141,7 @@ Stored AssignLibraryRaw(const ElementTarget& target, const Value& value) {
     return kPointerLength;
 }
 
-// --- Numbers ----------------------------------------------------------------------------------------------------------
+// --- Numbers -------------------------------------------------------------------------------------------------------
 
 // Reads the whole text as a number of the type; nothing when something is left over or it does not fit.
 template <class Number> std::optional<Number> ReadNumber(std::string_view text) {
@@ -191,7 +192,7 @@ template <uint32_t kSize> Stored AssignDecimalFloat(const ElementTarget& target,
     return Copy(target, 0, {reinterpret_cast<const char*>(bytes), kSize}, target.size);
 }
 
-// --- Dates ------------------------------------------------------------------------------------------------------------
+// --- Dates ---------------------------------------------------------------------------------------------------------
 
 Stored AssignSevenByteDate(const ElementTarget& target, const Value& value) {
     SevenByteDate date;
@@ -213,7 +214,7 @@ Stored AssignDate(const ElementTarget& target, const Value& value) {
     return sizeof date;
 }
 
-// --- Registered objects -----------------------------------------------------------------------------------------------
+// --- Registered objects --------------------------------------------------------------------------------------------
 
 template <Kind kKind> Stored AssignObject(const ElementTarget& target, const Value& value) {
     void* object = IsInvalid(value.word) ? InvalidObject() : nullptr;
@@ -228,7 +229,7 @@ Stored AssignResultSet(const ElementTarget& target, const Value& value) {
     return stored ? stored : AssignObject<Kind::stmt>(target, value);
 }
 
-// --- Types ------------------------------------------------------------------------------------------------------------
+// --- Types ---------------------------------------------------------------------------------------------------------
 
 struct TypeAssignment {
     int type;

@@ -27,7 +27,7 @@ void EndLine(Line& line) {
     line.Character('\n').Print();
 }
 
-// --- Texts and bytes --------------------------------------------------------------------------------------------------
+// --- Texts and bytes -----------------------------------------------------------------------------------------------
 
 void ShowText(Line& line, std::string_view text, bool utf16) {
     if (AddQuotedText(line, text.data(), text.size(), utf16)) EndLine(line);
@@ -87,7 +87,7 @@ void ShowLibraryRaw(Line& line, const ElementView& element) {
     ShowBytes(line, {reinterpret_cast<const char*>(bytes), length});
 }
 
-// --- Numbers ----------------------------------------------------------------------------------------------------------
+// --- Numbers -------------------------------------------------------------------------------------------------------
 
 void ShowNumber(Line& line, const ElementView& element) {
     const auto number = ReadElement<OCINumber>(element.data, element.size);
@@ -114,8 +114,8 @@ void ShowReal(Line& line, const ElementView& element) {
 
 void ShowPackedDecimal(Line& line, const ElementView& element) {
     constexpr size_t kSignPointAndEnd = 4;
-    std::string text(kSignPointAndEnd + std::max<size_t>(element.precision, static_cast<size_t>(std::abs(element.scale))),
-                     '\0');
+    const int digits = std::max<int>(element.precision, std::abs(element.scale));
+    std::string text(kSignPointAndEnd + static_cast<size_t>(digits), '\0');
     // The type may have been changed, and the precision speak of more bytes than there are.
     const bool whole = PackedDecimalSize(element.precision) <= element.size;
     const int rc = !whole ? kDecimalBadSign
@@ -137,7 +137,7 @@ void ShowDecimalFloat(Line& line, const ElementView& element) {
     EndLine(line);
 }
 
-// --- Dates ------------------------------------------------------------------------------------------------------------
+// --- Dates ---------------------------------------------------------------------------------------------------------
 
 void ShowSevenByteDate(Line& line, const ElementView& element) {
     SevenByteDate date;
@@ -161,16 +161,17 @@ void ShowDate(Line& line, const ElementView& element) {
     AddDate(line, ReadElement<OCIDate>(element.data, element.size));
 }
 
-// Adds the datetime as the library reads it, with `quote` around, and ends the line; a failing read is reported instead.
+// Adds the datetime as the library reads it, with `quote` around, and ends the line; a failing read is reported
+// instead.
 void AddDateTime(Line& line, OCIDateTime* datetime, const char* quote) {
     sb2 year = 0;
     ub1 month = 0, day = 0, hour = 0, minute = 0, second = 0;
     ub4 fraction = 0;
-    sword rc = Call(&ClientLibrary::OCIDateTimeGetDateNS, DefaultEnvironment, DefaultErrorHandle, datetime, &year, &month,
-                    &day);
+    sword rc = Call(&ClientLibrary::OCIDateTimeGetDateNS, DefaultEnvironment, DefaultErrorHandle, datetime, &year,
+                    &month, &day);
     if (rc == OCI_SUCCESS)
-        rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, DefaultEnvironment, DefaultErrorHandle, datetime, &hour, &minute,
-                  &second, &fraction);
+        rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, DefaultEnvironment, DefaultErrorHandle, datetime, &hour,
+                  &minute, &second, &fraction);
     if (rc != OCI_SUCCESS) return Fail(line, rc);
     line.Format("%s%04d-%02d-%02d %02d:%02d:%02d.%06d%s\n", quote, year, month, day, hour, minute, second,
                 static_cast<int>(fraction), quote);
@@ -181,7 +182,7 @@ void ShowDateTime(Line& line, const ElementView& element) {
     AddDateTime(line, ReadElement<OCIDateTime*>(element.data, element.size), "\"");
 }
 
-// --- Handles ----------------------------------------------------------------------------------------------------------
+// --- Handles -------------------------------------------------------------------------------------------------------
 
 void ShowHandle(Line& line, const ElementView& element) {
     const bool null = ReadElement<void*>(element.data, element.size) == nullptr;

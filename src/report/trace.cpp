@@ -4,8 +4,8 @@
 
 namespace {
 
-// How a line goes on after the function's name. The texts are what scripts' logs have always held: the rowid label lacks
-// a blank, one function's name is doubled, two lines are not ended.
+// How a line goes on after the function's name. The texts are what scripts' logs have always held: the rowid label
+// lacks a blank, one function's name is doubled, two lines are not ended.
 enum class Ending { name, name_and_rc, rc, plain, unended };
 
 struct Label {

@@ -23,7 +23,8 @@ TEST(Registry, CapacitiesAndMessages) {
         const char* overflow;
         const char* in_use;
     } cases[] = {
-        {Kind::environment, 30, "Reached max environment handle count - 30\n", "*** Environment handle already in use\n"},
+        {Kind::environment, 30, "Reached max environment handle count - 30\n",
+         "*** Environment handle already in use\n"},
         {Kind::error, 30, "Reached max error handle count - 30\n", "*** Error handle already in use\n"},
         {Kind::svc, 800, "Reached max svc handle count - 800\n", "*** Svc handle already in use\n"},
         {Kind::server, 800, "Reached max server handle count - 800\n", "*** Server handle already in use\n"},

@@ -61,8 +61,8 @@ TEST(Trace, OneFunctionOfEachLabel) {
 }
 
 TEST(Trace, CodesWithoutALine) {
-    for (const int code : {-1, 0, 199, 319, 320, 325, 326, 328, 330, 335, 341, 342, 343, 344, 350, 351, 352, 360, 361, 367,
-                           373, 406, 413, 446, 453})
+    for (const int code : {-1,  0,   199, 319, 320, 325, 326, 328, 330, 335, 341, 342, 343,
+                           344, 350, 351, 352, 360, 361, 367, 373, 406, 413, 446, 453})
         EXPECT_EQ(Trace(code, 0, "x"), "outputOCI (): unrecognized command!\n") << code;
 }
 

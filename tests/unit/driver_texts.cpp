@@ -22,7 +22,8 @@ std::string Wide(std::string_view text) {
 }
 
 std::string Succeeded(int in, int out) {
-    return "convertToUTF16 succeeded - In length - " + std::to_string(in) + ", Out length - " + std::to_string(out) + "\n";
+    return "convertToUTF16 succeeded - In length - " + std::to_string(in) + ", Out length - " + std::to_string(out) +
+           "\n";
 }
 
 // A word as commands get it: in a token buffer.
