@@ -2,10 +2,14 @@
 #include <algorithm>
 #include <span>
 
+#include "date/descriptor.h"
 #include "handles/gate.h"
 #include "handles/plain_objects.h"
 #include "oci.h"
 #include "sessions/service_context.h"
+#include "statements/parameter.h"
+#include "statements/result_set.h"
+#include "values/rowid_descriptor.h"
 
 namespace {
 
@@ -32,9 +36,9 @@ constexpr Maker kHandles[] = {
     {OCI_HTYPE_ENV, MakeEnvironment},
     {OCI_HTYPE_ERROR, Make<ErrorHandle>},
     {OCI_HTYPE_SVCCTX, Make<ServiceContext>},
-    {OCI_HTYPE_STMT, Make<PlainHandle>},
-    {OCI_HTYPE_BIND, Make<PlainHandle>},
-    {OCI_HTYPE_DEFINE, Make<PlainHandle>},
+    {OCI_HTYPE_STMT, Make<Statement>},
+    {OCI_HTYPE_BIND, Make<Bind>},
+    {OCI_HTYPE_DEFINE, Make<Define>},
     {OCI_HTYPE_DESCRIBE, Make<PlainHandle>},
     {OCI_HTYPE_SERVER, Make<Server>},
     {OCI_HTYPE_SESSION, Make<Session>},
@@ -63,9 +67,9 @@ constexpr Maker kHandles[] = {
 constexpr Maker kDescriptors[] = {
     {OCI_DTYPE_LOB, Make<PlainDescriptor>},
     {OCI_DTYPE_SNAP, Make<Snapshot>},
-    {OCI_DTYPE_RSET, Make<PlainDescriptor>},
-    {OCI_DTYPE_PARAM, Make<PlainDescriptor>},
-    {OCI_DTYPE_ROWID, Make<PlainDescriptor>},
+    {OCI_DTYPE_RSET, Make<ResultSet>},
+    {OCI_DTYPE_PARAM, Make<Parameter>},
+    {OCI_DTYPE_ROWID, Make<RowIdDescriptor>},
     {OCI_DTYPE_COMPLEXOBJECTCOMP, Make<PlainDescriptor>},
     {OCI_DTYPE_FILE, Make<PlainDescriptor>},
     {OCI_DTYPE_AQENQ_OPTIONS, Make<PlainDescriptor>},
@@ -73,15 +77,15 @@ constexpr Maker kDescriptors[] = {
     {OCI_DTYPE_AQMSG_PROPERTIES, Make<PlainDescriptor>},
     {OCI_DTYPE_AQAGENT, Make<PlainDescriptor>},
     {OCI_DTYPE_LOCATOR, Make<PlainDescriptor>},
-    {OCI_DTYPE_INTERVAL_YM, Make<PlainDescriptor>},
+    {OCI_DTYPE_INTERVAL_YM, Make<DateTimeDescriptor>},    // the general datetime has this number, too
     {OCI_DTYPE_INTERVAL_DS, Make<PlainDescriptor>},
     {OCI_DTYPE_AQNFY_DESCRIPTOR, Make<PlainDescriptor>},
-    {OCI_DTYPE_DATE, Make<PlainDescriptor>},
-    {OCI_DTYPE_TIME, Make<PlainDescriptor>},
-    {OCI_DTYPE_TIME_TZ, Make<PlainDescriptor>},
-    {OCI_DTYPE_TIMESTAMP, Make<PlainDescriptor>},
-    {OCI_DTYPE_TIMESTAMP_TZ, Make<PlainDescriptor>},
-    {OCI_DTYPE_TIMESTAMP_LTZ, Make<PlainDescriptor>},
+    {OCI_DTYPE_DATE, Make<DateTimeDescriptor>},
+    {OCI_DTYPE_TIME, Make<DateTimeDescriptor>},
+    {OCI_DTYPE_TIME_TZ, Make<DateTimeDescriptor>},
+    {OCI_DTYPE_TIMESTAMP, Make<DateTimeDescriptor>},
+    {OCI_DTYPE_TIMESTAMP_TZ, Make<DateTimeDescriptor>},
+    {OCI_DTYPE_TIMESTAMP_LTZ, Make<DateTimeDescriptor>},
     {OCI_DTYPE_UCB, Make<PlainDescriptor>},
     {OCI_DTYPE_SRVDN, Make<PlainDescriptor>},
     {OCI_DTYPE_SIGNATURE, Make<PlainDescriptor>},
@@ -96,7 +100,8 @@ constexpr Maker kDescriptors[] = {
 };
 
 const Maker* Find(std::span<const Maker> makers, TypeCode type) {
-    const auto found = std::find_if(makers.begin(), makers.end(), [type](const Maker& maker) { return maker.type == type; });
+    const auto found =
+        std::find_if(makers.begin(), makers.end(), [type](const Maker& maker) { return maker.type == type; });
     return found == makers.end() ? nullptr : &*found;
 }
 

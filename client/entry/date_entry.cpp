@@ -1,0 +1,191 @@
+// The date package: calendar functions on OCIDate.
+#include <string>
+
+#include "date/date.h"
+#include "date/format.h"
+#include "handles/gate.h"
+
+namespace {
+
+constexpr int kTextTooLong = 1877;
+constexpr int kMalformedText = 24501;
+constexpr std::size_t kLongestText = 4000;    // bytes of any text here; what claims more is not read
+
+// A text argument that may be missing.
+class OptionalText {
+public:
+    OptionalText(const Environment& environment, const OraText* text, std::size_t length)
+        : given_(text != nullptr && length > 0), too_long_(length > kLongestText),
+          text_(environment, text, too_long_ ? 0 : length) {}
+
+    [[nodiscard]] date::Errno Problem() const {
+        if (given_ && too_long_) return kTextTooLong;
+        return text_.Valid() ? 0 : kMalformedText;
+    }
+    [[nodiscard]] std::string_view Or(std::string_view otherwise) const { return given_ ? text_.View() : otherwise; }
+
+private:
+    bool given_;
+    bool too_long_;
+    TextIn text_;
+};
+
+// What both text functions take beside the text: the model and the language.
+class ModelArguments {
+public:
+    ModelArguments(const Environment& environment, const OraText* model, std::size_t model_length, const OraText* language,
+                   std::size_t language_length)
+        : model_(environment, model, model_length), language_(environment, language, language_length) {}
+
+    date::Errno Resolve() {
+        if (const int number = model_.Problem()) return number;
+        if (const int number = language_.Problem()) return number;
+        const std::string_view name = language_.Or({});
+        known_ = name.empty() ? &date::kEnglish : date::FindLanguage(name);
+        return known_ ? 0 : date::kBadLanguage;
+    }
+
+    [[nodiscard]] std::string_view Model() const { return model_.Or(date::kShortDateModel); }
+    [[nodiscard]] const date::Language& Language() const { return *known_; }
+
+private:
+    OptionalText model_;
+    OptionalText language_;
+    const date::Language* known_ = nullptr;
+};
+
+// A date made from a date: change(value, result).
+template <class Change>
+sword MakeDate(OCIError* err, const OCIDate* given, OCIDate* out, Change change) {
+    return EnterError(err, [&](ErrorHandle&) -> Status {
+        if (!given || !out) return Error(kNullArgument);
+        date::DateTime result;
+        if (const int number = change(date::FromOciDate(*given), &result)) return Error(number);
+        date::ToOciDate(result, out);
+        return {};
+    });
+}
+
+// A number from two dates: measure(left, right). Both must be valid.
+template <class Number, class Measure>
+sword MeasureDates(OCIError* err, const OCIDate* left, const OCIDate* right, Number* out, Measure measure) {
+    return EnterError(err, [&](ErrorHandle&) -> Status {
+        if (!left || !right || !out) return Error(kNullArgument);
+        const date::DateTime first = date::FromOciDate(*left), second = date::FromOciDate(*right);
+        if (const int number = date::Validate(first)) return Error(number);
+        if (const int number = date::Validate(second)) return Error(number);
+        *out = measure(first, second);
+        return {};
+    });
+}
+
+// Writes into the application's area; the length is set to the text's, or to what would be needed.
+Status WriteText(const Environment& environment, const date::DateTime& value, const ModelArguments& arguments, ub4* size,
+                 OraText* out) {
+    std::string text(256, '\0');
+    std::size_t length = 0;
+    auto write = [&] {
+        return date::ToText(value, arguments.Model(), arguments.Language(), date::Scope::date, text.data(), text.size(),
+                            &length);
+    };
+    int number = write();
+    if (number == date::kTextBufferTooSmall) {
+        text.resize(length);
+        number = write();
+    }
+    if (number) return Error(number);
+    std::string converted;
+    const std::string_view shown = TextOut(environment, std::string_view(text).substr(0, length), converted);
+    const ub4 room = *size;
+    *size = static_cast<ub4>(shown.size());
+    if (shown.size() > room) return Error(date::kTextBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
+    shown.copy(reinterpret_cast<char*>(out), shown.size());
+    return {};
+}
+
+}  // namespace
+
+sword OCIDateAddDays(OCIError* err, const OCIDate* given, sb4 days, OCIDate* out) {
+    return MakeDate(err, given, out, [days](const auto& value, auto* result) { return date::AddDays(value, days, result); });
+}
+
+sword OCIDateAddMonths(OCIError* err, const OCIDate* given, sb4 months, OCIDate* out) {
+    return MakeDate(err, given, out,
+                    [months](const auto& value, auto* result) { return date::AddMonths(value, months, result); });
+}
+
+sword OCIDateAssign(OCIError* err, const OCIDate* from, OCIDate* to) {
+    return MakeDate(err, from, to, [](const auto& value, auto* result) { return date::AddDays(value, 0, result); });
+}
+
+sword OCIDateLastDay(OCIError* err, const OCIDate* given, OCIDate* out) {
+    return MakeDate(err, given, out, [](const auto& value, auto* result) { return date::LastDay(value, result); });
+}
+
+sword OCIDateNextDay(OCIError* err, const OCIDate* given, const OraText* day, ub4 dayLen, OCIDate* out) {
+    return EnterError(err, [&](ErrorHandle& error) -> Status {
+        if (!given || !day || !out) return Error(kNullArgument);
+        const OptionalText name(error.Env(), day, dayLen);
+        if (const int number = name.Problem()) return Error(number);
+        int day_of_week = 0;
+        if (const int number = date::WeekdayFromName(name.Or({}), date::kEnglish, &day_of_week)) return Error(number);
+        date::DateTime result;
+        if (const int number = date::NextDay(date::FromOciDate(*given), day_of_week, &result)) return Error(number);
+        date::ToOciDate(result, out);
+        return {};
+    });
+}
+
+sword OCIDateCheck(OCIError* err, const OCIDate* given, uword* flags) {
+    return EnterError(err, [&](ErrorHandle&) -> Status {
+        if (!given || !flags) return Error(kNullArgument);
+        *flags = date::Check(date::FromOciDate(*given));
+        return {};
+    });
+}
+
+sword OCIDateCompare(OCIError* err, const OCIDate* date1, const OCIDate* date2, sword* out) {
+    return MeasureDates(err, date1, date2, out, date::Compare);
+}
+
+sword OCIDateDaysBetween(OCIError* err, const OCIDate* date1, const OCIDate* date2, sb4* days) {
+    return MeasureDates(err, date1, date2, days, date::DaysBetween);
+}
+
+sword OCIDateSysDate(OCIError* err, OCIDate* out) {
+    return EnterError(err, [&](ErrorHandle&) -> Status {
+        if (!out) return Error(kNullArgument);
+        date::ToOciDate(date::Now(), out);
+        return {};
+    });
+}
+
+sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraText* fmt, ub1 fmtLen, const OraText* lang,
+                      ub4 langLen, OCIDate* out) {
+    return EnterError(err, [&](ErrorHandle& error) -> Status {
+        if (!str || !out) return Error(kNullArgument);
+        const OptionalText text(error.Env(), str, strLen);
+        if (const int number = text.Problem()) return Error(number);
+        ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
+        if (const int number = arguments.Resolve()) return Error(number);
+        date::DateTime value;
+        if (const int number =
+                date::FromText(text.Or({}), arguments.Model(), arguments.Language(), date::Scope::date, &value)) {
+            return Error(number);
+        }
+        date::ToOciDate(value, out);
+        return {};
+    });
+}
+
+sword OCIDateToText(OCIError* err, const OCIDate* given, const OraText* fmt, ub1 fmtLen, const OraText* lang, ub4 langLen,
+                    ub4* bufsize, OraText* buf) {
+    return EnterError(err, [&](ErrorHandle& error) -> Status {
+        if (!given || !bufsize || !buf) return Error(kNullArgument);
+        const date::DateTime value = date::FromOciDate(*given);
+        if (const int number = date::Validate(value)) return Error(number);
+        ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
+        if (const int number = arguments.Resolve()) return Error(number);
+        return WriteText(error.Env(), value, arguments, bufsize, buf);
+    });
+}

@@ -1,0 +1,141 @@
+// The datetime package: calls on datetime descriptors. Each published function and its twin whose name ends in NS do the
+// same. Fractions are microseconds, or nanoseconds when kelpcli.ini says so.
+#include "date/descriptor.h"
+#include "date/fraction.h"
+#include "handles/gate.h"
+
+namespace {
+
+constexpr std::size_t kLongestZone = 256;    // bytes of a zone's text; what claims more is not read
+
+// A descriptor that is no living one is refused like any bad handle; null is a missing argument.
+Status FindDescriptor(const OCIDateTime* pointer, DateTimeDescriptor*& descriptor) {
+    if (!pointer) return Error(kNullArgument);
+    descriptor = Live<DateTimeDescriptor>(pointer);
+    return descriptor ? Status() : InvalidHandle();
+}
+
+// Calls on one descriptor: body(environment, descriptor).
+template <class Body>
+sword EnterDateTime(void* handle, OCIError* err, const OCIDateTime* pointer, Body body) {
+    return EnterHandle(handle, err, [&](Environment& environment) -> Status {
+        DateTimeDescriptor* descriptor = nullptr;
+        Status found = FindDescriptor(pointer, descriptor);
+        return found.Ok() ? body(environment, *descriptor) : found;
+    });
+}
+
+// Calls on two: body(first, second).
+template <class Body>
+sword EnterDateTimes(void* handle, OCIError* err, const OCIDateTime* first, const OCIDateTime* second, Body body) {
+    return EnterDateTime(handle, err, first, [&](Environment&, DateTimeDescriptor& one) -> Status {
+        DateTimeDescriptor* other = nullptr;
+        Status found = FindDescriptor(second, other);
+        return found.Ok() ? body(one, *other) : found;
+    });
+}
+
+Status ReadZone(const Environment& environment, const OraText* text, std::size_t length, std::string& zone) {
+    if (text && length > kLongestZone) return Error(1857);
+    const TextIn given(environment, text, length);
+    if (!given.Valid()) return Error(24501);
+    zone = given.View();
+    return {};
+}
+
+}  // namespace
+
+sword OCIDateTimeAssign(dvoid* hndl, OCIError* err, const OCIDateTime* from, OCIDateTime* to) {
+    return EnterDateTimes(hndl, err, from, to, [](const auto& source, auto& target) { return target.Assign(source); });
+}
+
+sword OCIDateTimeCheck(dvoid* hndl, OCIError* err, const OCIDateTime* date, ub4* flags) {
+    return EnterDateTime(hndl, err, date, [flags](Environment&, const DateTimeDescriptor& descriptor) -> Status {
+        if (!flags) return Error(kNullArgument);
+        *flags = descriptor.Check();
+        return {};
+    });
+}
+
+sword OCIDateTimeCompare(dvoid* hndl, OCIError* err, const OCIDateTime* date1, const OCIDateTime* date2, sword* out) {
+    return EnterDateTimes(hndl, err, date1, date2, [out](const auto& left, const auto& right) {
+        return out ? DateTimeDescriptor::Compare(left, right, out) : Error(kNullArgument);
+    });
+}
+
+sword OCIDateTimeConstruct(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 year, ub1 month, ub1 day, ub1 hour, ub1 min,
+                           ub1 sec, ub4 fsec, OraText* tz, size_t tzLen) {
+    return EnterDateTime(hndl, err, date, [&](const Environment& environment, DateTimeDescriptor& descriptor) -> Status {
+        date::DateTime fields{.year = year, .month = month, .day = day, .hour = hour, .minute = min, .second = sec};
+        if (!date::FractionToNanoseconds(fsec, &fields.nanosecond)) return Error(date::kBadFraction);
+        std::string zone;
+        Status read = ReadZone(environment, tz, tzLen, zone);
+        return read.Ok() ? descriptor.Construct(fields, zone) : read;
+    });
+}
+
+sword OCIDateTimeGetDate(dvoid* hndl, OCIError* err, const OCIDateTime* date, sb2* year, ub1* month, ub1* day) {
+    return EnterDateTime(hndl, err, date, [&](Environment&, const DateTimeDescriptor& descriptor) -> Status {
+        if (!year || !month || !day) return Error(kNullArgument);
+        date::DateTime value;
+        Status got = descriptor.GetDate(&value);
+        if (!got.Ok()) return got;
+        *year = value.year;
+        *month = value.month;
+        *day = value.day;
+        return {};
+    });
+}
+
+sword OCIDateTimeGetTime(dvoid* hndl, OCIError* err, OCIDateTime* date, ub1* hour, ub1* min, ub1* sec, ub4* fsec) {
+    return EnterDateTime(hndl, err, date, [&](Environment&, const DateTimeDescriptor& descriptor) -> Status {
+        if (!hour || !min || !sec || !fsec) return Error(kNullArgument);
+        date::DateTime value;
+        Status got = descriptor.GetTime(&value);
+        if (!got.Ok()) return got;
+        *hour = value.hour;
+        *min = value.minute;
+        *sec = value.second;
+        *fsec = date::NanosecondsToFraction(value.nanosecond);
+        return {};
+    });
+}
+
+sword OCI_datetimeSetDate(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 year, ub1 month, ub1 day) {
+    return EnterDateTime(hndl, err, date, [&](Environment&, DateTimeDescriptor& descriptor) {
+        return descriptor.SetDate({.year = year, .month = month, .day = day});
+    });
+}
+
+sword OCI_datetimeSetTime(dvoid* hndl, OCIError* err, OCIDateTime* date, ub1 hour, ub1 min, ub1 sec, ub4 fsec) {
+    return EnterDateTime(hndl, err, date, [&](Environment&, DateTimeDescriptor& descriptor) -> Status {
+        date::DateTime time{.hour = hour, .minute = min, .second = sec};
+        if (!date::FractionToNanoseconds(fsec, &time.nanosecond)) return Error(date::kBadFraction);
+        return descriptor.SetTime(time);
+    });
+}
+
+sword OCIDateTimeAssignNS(dvoid* hndl, OCIError* err, const OCIDateTime* from, OCIDateTime* to) {
+    return OCIDateTimeAssign(hndl, err, from, to);
+}
+
+sword OCIDateTimeCheckNS(dvoid* hndl, OCIError* err, const OCIDateTime* date, ub4* flags) {
+    return OCIDateTimeCheck(hndl, err, date, flags);
+}
+
+sword OCIDateTimeCompareNS(dvoid* hndl, OCIError* err, const OCIDateTime* date1, const OCIDateTime* date2, sword* out) {
+    return OCIDateTimeCompare(hndl, err, date1, date2, out);
+}
+
+sword OCIDateTimeConstructNS(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 year, ub1 month, ub1 day, ub1 hour,
+                             ub1 min, ub1 sec, ub4 fsec, OraText* tz, size_t tzLen) {
+    return OCIDateTimeConstruct(hndl, err, date, year, month, day, hour, min, sec, fsec, tz, tzLen);
+}
+
+sword OCIDateTimeGetDateNS(dvoid* hndl, OCIError* err, const OCIDateTime* date, sb2* year, ub1* month, ub1* day) {
+    return OCIDateTimeGetDate(hndl, err, date, year, month, day);
+}
+
+sword OCIDateTimeGetTimeNS(dvoid* hndl, OCIError* err, OCIDateTime* date, ub1* hour, ub1* min, ub1* sec, ub4* fsec) {
+    return OCIDateTimeGetTime(hndl, err, date, hour, min, sec, fsec);
+}

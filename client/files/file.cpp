@@ -1,0 +1,160 @@
+// Files over the C library's streams. The standard ones are the process's own, so that what is written there comes in
+// order with what the application writes.
+#include "files/file.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <limits>
+#include <system_error>
+
+#include "oci_constants.h"
+
+namespace {
+
+constexpr int kCannotAccess = 30160;
+constexpr int kAccessDenied = 30157;
+constexpr int kIsDirectory = 30158;
+
+// What the system says and the number it gets; anything else is kCannotAccess.
+constexpr struct { int error; int number; } kSystemErrors[] = {
+    {EINVAL, kInvalidFileArgument}, {EEXIST, 30151}, {ENOENT, 30152}, {EIO, 30155}, {ENOSPC, 30156}, {EDQUOT, 30156},
+    {EACCES, kAccessDenied}, {EPERM, kAccessDenied}, {EROFS, kAccessDenied}, {EISDIR, kIsDirectory}, {EFBIG, 30159},
+    {EOVERFLOW, 30159}};
+
+Status SystemError(const std::string& name, int error) {
+    int number = kCannotAccess;
+    for (const auto& row : kSystemErrors) {
+        if (row.error == error) number = row.number;
+    }
+    return Error(number, name + ": " + std::system_category().message(error));
+}
+
+Status InvalidArgument(const char* what) { return Error(kInvalidFileArgument, what); }
+
+constexpr const char* kStreamModes[] = {nullptr, "r", "w", "r+"};    // by open mode; what is appended is the descriptor's care
+constexpr int kAccessModes[] = {0, O_RDONLY, O_WRONLY, O_RDWR};
+
+int OpenFlags(std::uint32_t mode, std::uint32_t create) {
+    int flags = kAccessModes[mode] | O_CLOEXEC;
+    if (create != OCI_FILE_EXIST) flags |= O_CREAT;
+    if (create & OCI_FILE_EXCL) flags |= O_EXCL;
+    if (create & OCI_FILE_TRUNCATE) flags |= O_TRUNC;
+    if (create & OCI_FILE_APPEND) flags |= O_APPEND;
+    return flags;
+}
+
+bool IsDirectory(int descriptor) {
+    struct stat status {};
+    return fstat(descriptor, &status) == 0 && S_ISDIR(status.st_mode);
+}
+
+}  // namespace
+
+File::~File() {
+    if (stream_) (void)Close();
+}
+
+Status File::Use(std::FILE* stream, std::uint32_t mode, bool standard) {
+    stream_ = stream;
+    standard_ = standard;
+    readable_ = mode & OCI_FILE_READ_ONLY;
+    writable_ = mode & OCI_FILE_WRITE_ONLY;
+    return {};
+}
+
+Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t create, std::uint32_t type) {
+    constexpr std::uint32_t kAllCreateFlags = OCI_FILE_CREATE | OCI_FILE_EXCL | OCI_FILE_TRUNCATE | OCI_FILE_APPEND;
+    name_ = name;
+    if (type == OCI_FILE_STDIN) return Use(stdin, OCI_FILE_READ_ONLY, true);
+    if (type == OCI_FILE_STDOUT) return Use(stdout, OCI_FILE_WRITE_ONLY, true);
+    if (type == OCI_FILE_STDERR) return Use(stderr, OCI_FILE_WRITE_ONLY, true);
+    if (mode < OCI_FILE_READ_ONLY || mode > OCI_FILE_READ_WRITE) return InvalidArgument("unknown open mode");
+    if (create & ~kAllCreateFlags) return InvalidArgument("unknown create flag");
+    const int descriptor = open(name.c_str(), OpenFlags(mode, create), 0666);
+    if (descriptor < 0) return SystemError(name, errno);
+    if (IsDirectory(descriptor)) {
+        close(descriptor);
+        return SystemError(name, EISDIR);
+    }
+    std::FILE* stream = fdopen(descriptor, kStreamModes[mode]);
+    if (!stream) {
+        const int error = errno;
+        close(descriptor);
+        return SystemError(name, error);
+    }
+    return Use(stream, mode, false);
+}
+
+Status File::Close() {
+    const std::lock_guard lock(mutex_);
+    std::FILE* stream = stream_;
+    stream_ = nullptr;
+    errno = 0;
+    const bool failed = standard_ ? writable_ && std::fflush(stream) != 0 : std::fclose(stream) != 0;
+    return failed ? SystemError(name_, errno) : Status();
+}
+
+void File::Turn(Last next) {
+    if (!standard_ && last_ != Last::other && last_ != next) fseeko(stream_, 0, SEEK_CUR);
+    last_ = next;
+}
+
+Status File::Read(void* buffer, std::uint32_t size, std::uint32_t* count) {
+    const std::lock_guard lock(mutex_);
+    if (!readable_) return Error(kAccessDenied, name_ + ": not open for reading");
+    Turn(Last::read);
+    errno = 0;
+    *count = static_cast<std::uint32_t>(std::fread(buffer, 1, size, stream_));
+    const bool failed = *count < size && std::ferror(stream_);
+    const int error = errno;
+    if (*count < size) std::clearerr(stream_);    // what is appended later can still be read
+    return failed ? SystemError(name_, error) : Status();
+}
+
+Status File::Write(const void* data, std::uint32_t size, std::uint32_t* count) {
+    const std::lock_guard lock(mutex_);
+    if (!writable_) return Error(kAccessDenied, name_ + ": not open for writing");
+    Turn(Last::write);
+    errno = 0;
+    *count = static_cast<std::uint32_t>(std::fwrite(data, 1, size, stream_));
+    if (*count == size) return {};
+    const int error = errno;
+    std::clearerr(stream_);
+    return SystemError(name_, error);
+}
+
+Status File::Seek(std::uint32_t origin, std::uint64_t offset, int direction) {
+    const std::lock_guard lock(mutex_);
+    if (origin < OCI_FILE_SEEK_BEGINNING || origin > OCI_FILE_SEEK_END) return InvalidArgument("unknown seek origin");
+    if (direction != OCI_FILE_FORWARD && direction != OCI_FILE_BACKWARD) return InvalidArgument("unknown seek direction");
+    if (offset > static_cast<std::uint64_t>(std::numeric_limits<off_t>::max())) return InvalidArgument("offset too large");
+    constexpr int kOrigins[] = {0, SEEK_SET, SEEK_CUR, SEEK_END};
+    const auto distance = static_cast<off_t>(offset);
+    last_ = Last::other;
+    if (fseeko(stream_, direction == OCI_FILE_FORWARD ? distance : -distance, kOrigins[origin]) == 0) return {};
+    return SystemError(name_, errno);
+}
+
+Status File::Flush() {
+    const std::lock_guard lock(mutex_);
+    if (!writable_) return {};
+    errno = 0;
+    return std::fflush(stream_) == 0 ? Status() : SystemError(name_, errno);
+}
+
+Status FileExists(const std::string& name, bool* exists) {
+    struct stat status {};
+    *exists = stat(name.c_str(), &status) == 0;
+    return *exists || errno == ENOENT || errno == ENOTDIR ? Status() : SystemError(name, errno);
+}
+
+Status FileLength(const std::string& name, std::uint64_t* length) {
+    struct stat status {};
+    if (stat(name.c_str(), &status) != 0) return SystemError(name, errno);
+    if (S_ISDIR(status.st_mode)) return SystemError(name, EISDIR);
+    *length = static_cast<std::uint64_t>(status.st_size);
+    return {};
+}

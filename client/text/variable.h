@@ -1,0 +1,46 @@
+// Strings and raws: values of any length that the library keeps for the application. They belong to their environment and
+// their memory comes from it. A string holds its text in the application's form, so UTF-16 where the environment has that.
+#pragma once
+
+#include <cstdint>
+#include <string_view>
+
+#include "handles/object.h"
+#include "handles/status.h"
+
+class Variable : public Object {
+public:
+    explicit Variable(const Origin& origin) : Object(origin) {}
+    ~Variable() override;
+
+    // Two zeros follow the content, for those who read texts to their end. Valid until the next change.
+    [[nodiscard]] char* Data() const { return data_; }
+    [[nodiscard]] std::uint32_t Size() const { return size_; }
+    [[nodiscard]] std::uint32_t Room() const { return room_; }    // never below the size
+    [[nodiscard]] std::string_view View() const { return {data_, size_}; }
+
+    // Copies `content`, which may be part of this value. Error 22140 for what is too long; throws std::bad_alloc.
+    Status Assign(std::string_view content);
+    // Makes the room `size` bytes; of the content stays what fits.
+    Status Resize(std::uint32_t size);
+
+private:
+    // A block of so many bytes with the first `kept` of `content`.
+    void Replace(std::uint32_t room, std::string_view content);
+
+    char* data_ = nullptr;    // null while the room is 0
+    std::uint32_t size_ = 0;
+    std::uint32_t room_ = 0;
+};
+
+class String : public Variable {
+public:
+    static constexpr Kind kKind = Kind::string;
+    using Variable::Variable;
+};
+
+class Raw : public Variable {
+public:
+    static constexpr Kind kKind = Kind::raw;
+    using Variable::Variable;
+};

@@ -1,0 +1,211 @@
+// Threads. Each thread of the process that meets the package gets a record: who it is, and its values of keys. The
+// records are kept by the system's own thread-specific data, whose destructor runs when a thread ends, but not for the
+// main thread when the process does.
+#include "threads/thread.h"
+
+#include <pthread.h>
+
+#include <algorithm>
+#include <system_error>
+#include <utility>
+#include <vector>
+
+namespace {
+
+constexpr int kMisuse = 21560;
+constexpr int kCannotStart = 21500;
+
+Status Misuse(const char* what) { return Error(kMisuse, what); }
+
+std::atomic<std::uint64_t> last_number{0};
+
+struct KeyValue {
+    std::shared_ptr<KeyState> key;
+    void* value;
+};
+
+class ThreadRecord {
+public:
+    explicit ThreadRecord(std::shared_ptr<ThreadState> state) : state_(std::move(state)) {}
+    ThreadRecord(const ThreadRecord&) = delete;
+    ThreadRecord& operator=(const ThreadRecord&) = delete;
+
+    // Who waits for the thread goes on.
+    ~ThreadRecord() {
+        const std::lock_guard lock(state_->mutex);
+        state_->ended = true;
+        state_->ended_condition.notify_all();
+    }
+
+    [[nodiscard]] const std::shared_ptr<ThreadState>& State() const { return state_; }
+
+    void Set(const std::shared_ptr<KeyState>& key, void* value) {
+        const auto found = Find(*key);
+        if (found != values_.end()) {
+            found->value = value;
+            return;
+        }
+        std::erase_if(values_, [](const KeyValue& old) { return !old.key->alive; });
+        if (value) values_.push_back({key, value});
+    }
+
+    void* Get(const KeyState& key) {
+        const auto found = Find(key);
+        return found == values_.end() ? nullptr : found->value;
+    }
+
+    // The functions called may set values anew: a few rounds, then no more.
+    void DestroyValues() {
+        constexpr int kRounds = 4;
+        for (int round = 0; round < kRounds && !values_.empty(); ++round) {
+            for (const KeyValue& old : std::exchange(values_, {})) {
+                if (old.value && old.key->destroy && old.key->alive) old.key->destroy(old.value);
+            }
+        }
+    }
+
+private:
+    std::vector<KeyValue>::iterator Find(const KeyState& key) {
+        return std::find_if(values_.begin(), values_.end(), [&key](const KeyValue& value) { return value.key.get() == &key; });
+    }
+
+    std::shared_ptr<ThreadState> state_;
+    std::vector<KeyValue> values_;
+};
+
+void EndRecord(void* record);
+
+pthread_key_t RecordKey() {
+    static const pthread_key_t key = [] {
+        pthread_key_t made{};
+        if (pthread_key_create(&made, EndRecord) != 0) throw std::bad_alloc();
+        return made;
+    }();
+    return key;
+}
+
+// The functions of keys may use the package, so the record, which the system has taken away, stands until they are done.
+void EndRecord(void* given) {
+    const std::unique_ptr<ThreadRecord> record(static_cast<ThreadRecord*>(given));
+    pthread_setspecific(RecordKey(), given);
+    record->DestroyValues();
+    pthread_setspecific(RecordKey(), nullptr);
+}
+
+std::shared_ptr<ThreadState> NewState() {
+    auto state = std::make_shared<ThreadState>();
+    state->number = last_number.fetch_add(1) + 1;
+    return state;
+}
+
+ThreadRecord& AttachRecord(std::unique_ptr<ThreadRecord> record) {
+    if (pthread_setspecific(RecordKey(), record.get()) != 0) throw std::bad_alloc();
+    return *record.release();
+}
+
+ThreadRecord& CurrentRecord() {
+    if (auto* record = static_cast<ThreadRecord*>(pthread_getspecific(RecordKey()))) return *record;
+    return AttachRecord(std::make_unique<ThreadRecord>(NewState()));
+}
+
+struct Start {
+    void (*routine)(void* argument);
+    void* argument;
+    std::unique_ptr<ThreadRecord> record;
+};
+
+void* RunThread(void* given) {
+    std::unique_ptr<Start> start(static_cast<Start*>(given));
+    AttachRecord(std::move(start->record));
+    start->routine(start->argument);
+    return nullptr;
+}
+
+// Answers the system's error, 0 when the thread has taken over what it was given.
+int StartDetached(std::unique_ptr<Start>& start) {
+    pthread_attr_t detached;
+    pthread_attr_init(&detached);
+    pthread_attr_setdetachstate(&detached, PTHREAD_CREATE_DETACHED);
+    pthread_t thread{};
+    const int failed = pthread_create(&thread, &detached, RunThread, start.get());
+    pthread_attr_destroy(&detached);
+    if (!failed) start.release();
+    return failed;
+}
+
+}  // namespace
+
+const std::shared_ptr<ThreadState>& CurrentThread() { return CurrentRecord().State(); }
+
+Status ThreadMutex::Acquire() {
+    const std::uint64_t self = CurrentThread()->number;
+    std::unique_lock lock(guard_);
+    if (owner_ == self) return Misuse("the mutex is held by this thread already");
+    released_.wait(lock, [this] { return owner_ == 0; });
+    owner_ = self;
+    return {};
+}
+
+Status ThreadMutex::Release() {
+    const std::uint64_t self = CurrentThread()->number;
+    const std::lock_guard lock(guard_);
+    if (owner_ != self) return Misuse("the mutex is not held by this thread");
+    owner_ = 0;
+    released_.notify_one();
+    return {};
+}
+
+Status ThreadMutex::CheckFree() {
+    const std::lock_guard lock(guard_);
+    return owner_ == 0 ? Status() : Misuse("the mutex is held");
+}
+
+ThreadKey::ThreadKey(const Origin& origin, void (*destroy)(void* value))
+    : Object(origin), state_(std::make_shared<KeyState>(destroy)) {}
+
+ThreadKey::~ThreadKey() { state_->alive = false; }
+
+void ThreadKey::Set(void* value) { CurrentRecord().Set(state_, value); }
+
+void* ThreadKey::Get() const { return CurrentRecord().Get(*state_); }
+
+std::shared_ptr<ThreadState> ThreadHandle::Set(std::shared_ptr<ThreadState> state) {
+    const std::lock_guard lock(mutex_);
+    return std::exchange(state_, std::move(state));
+}
+
+std::shared_ptr<ThreadState> ThreadHandle::State() {
+    const std::lock_guard lock(mutex_);
+    return state_;
+}
+
+Status ThreadHandle::Join() {
+    const std::shared_ptr<ThreadState> state = State();
+    if (!state) return Misuse("the handle has no thread");
+    if (state == CurrentThread()) return Misuse("a thread cannot join itself");
+    std::unique_lock lock(state->mutex);
+    if (state->joined) return Misuse("the thread is joined already");
+    state->joined = true;
+    state->ended_condition.wait(lock, [&state] { return state->ended; });
+    return {};
+}
+
+Status ThreadHandle::Close() {
+    const std::lock_guard lock(mutex_);
+    if (!state_) return Misuse("the handle has no thread");
+    state_.reset();
+    return {};
+}
+
+Status StartThread(void (*routine)(void* argument), void* argument, ThreadId* id, ThreadHandle* handle) {
+    std::shared_ptr<ThreadState> state = NewState();
+    auto start = std::make_unique<Start>(Start{routine, argument, std::make_unique<ThreadRecord>(state)});
+    const std::uint64_t old_number = id ? id->number.exchange(state->number) : 0;
+    std::shared_ptr<ThreadState> old_state = handle ? handle->Set(std::move(state)) : nullptr;
+    if (const int failed = StartDetached(start)) {
+        if (id) id->number = old_number;
+        if (handle) handle->Set(std::move(old_state));
+        return Error(kCannotStart, std::system_category().message(failed));
+    }
+    return {};
+}
