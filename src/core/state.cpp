@@ -2,7 +2,7 @@
 
 OCIEnv* DefaultEnvironment = nullptr;
 OCIError* DefaultErrorHandle = nullptr;
-bool Utf16Mode = false;
+std::atomic<bool> Utf16Mode = false;
 
 uint32_t application_code_page = 0;
 uint32_t second_code_page = 0;
@@ -12,4 +12,4 @@ bool password_given = false;
 bool replace_password = false;
 bool print_sql_function_code = false;
 
-int report_switch = 1;
+std::atomic<int> report_switch = 1;
