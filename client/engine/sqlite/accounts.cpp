@@ -1,3 +1,4 @@
+// Accounts: the table, hashing, and the first logon that makes an owner.
 #include "engine/sqlite/accounts.h"
 
 #include <crypt.h>

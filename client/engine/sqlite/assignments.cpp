@@ -1,3 +1,4 @@
+// Finding where a statement stores values, by its pieces. Forms that are not understood are left as they are.
 #include "engine/sqlite/assignments.h"
 
 #include <algorithm>

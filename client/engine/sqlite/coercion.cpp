@@ -1,3 +1,4 @@
+// Making values what a column takes: the cheap tests first, so that a value that fits costs little.
 #include "engine/sqlite/coercion.h"
 
 #include <cmath>

@@ -1,3 +1,4 @@
+// Declared types: one table row a type.
 #include "engine/sqlite/column_types.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// Opening a database, compiling statements, transactions, waiting for locks, cancelling.
 #include "engine/sqlite/connection.h"
 
 #include <cctype>

@@ -1,3 +1,4 @@
+// Describing columns: declarations first, then the text of the select list, then the first value.
 #include "engine/sqlite/describe.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// Result codes and messages of SQLite: one table row a code or a beginning of a message.
 #include "engine/sqlite/errors.h"
 
 #include <cstdio>

@@ -1,3 +1,4 @@
+// The SQL functions. Arguments that are null make a null.
 #include "engine/sqlite/functions.h"
 
 #include <algorithm>

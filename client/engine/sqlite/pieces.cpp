@@ -1,3 +1,4 @@
+// Cutting SQL text into pieces.
 #include "engine/sqlite/pieces.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// Binding, stepping and reading. Nothing is allocated for a row.
 #include "engine/sqlite/query.h"
 
 #include <algorithm>

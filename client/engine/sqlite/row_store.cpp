@@ -1,3 +1,4 @@
+// Rows in blocks of memory and, beyond a limit, of a temporary file.
 #include "engine/sqlite/row_store.h"
 
 #include <algorithm>

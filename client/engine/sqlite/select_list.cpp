@@ -1,3 +1,4 @@
+// Reading the items of a select list.
 #include "engine/sqlite/select_list.h"
 
 #include <algorithm>

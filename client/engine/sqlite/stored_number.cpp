@@ -1,3 +1,4 @@
+// Numbers to and from the three forms in which they lie in a file.
 #include "engine/sqlite/stored_number.h"
 
 #include <cstring>
