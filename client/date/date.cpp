@@ -1,5 +1,5 @@
-// The calendar: day numbers, checks, arithmetic. The two conversions between dates and day numbers are the usual integer
-// formulas for the Julian and the Gregorian calendar, on years that astronomers count (1 BC is 0).
+// The calendar: day numbers, checks, arithmetic. The two conversions between dates and day numbers are the usual
+// integer formulas for the Julian and the Gregorian calendar, on years that astronomers count (1 BC is 0).
 #include "date/date.h"
 
 #include <ctime>

@@ -3,8 +3,8 @@
 // date/zone.h.
 //
 // The calendar is the historical one: Julian days to 4 October 1582, Gregorian ones from 15 October 1582, none between,
-// and no year 0 (-1 is 1 BC). Functions answer 0 or a published error number and write results on success only; a result
-// may be one of the operands. Nothing here throws or allocates.
+// and no year 0 (-1 is 1 BC). Functions answer 0 or a published error number and write results on success only; a
+// result may be one of the operands. Nothing here throws or allocates.
 #pragma once
 
 #include <cstddef>
@@ -91,8 +91,9 @@ constexpr std::size_t kDateBytes = 7;
 Errno FromBytes(const std::uint8_t* bytes, DateTime* result) noexcept;
 void ToBytes(const DateTime& value, std::uint8_t* bytes) noexcept;
 
-// The engines' text: "YYYY-MM-DD HH:MM:SS", then the fraction without its trailing zeros if there is one, then " +hh:mm"
-// with a zone; "-YYYY-..." before the common era. Texts without a zone order as their values do.
+// The engines' text: "YYYY-MM-DD HH:MM:SS", then the fraction without its trailing zeros if there is one, then
+// " +hh:mm" with a zone; "-YYYY-..." before the common era. Texts without a zone and of the common era order as their
+// values do.
 constexpr std::size_t kMaxEngineText = 40;
 std::size_t ToEngineText(const DateTime& value, char* text) noexcept;    // no terminator; answers the length
 // Reads that and what engines write besides: a date alone, a time alone (the date is 0 then), T for the blank, the zone

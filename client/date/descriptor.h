@@ -22,8 +22,8 @@ public:
     // Takes fields as they were given, in the zone that `zone` names: empty means that of the process. Fields of parts
     // that the type lacks are ignored; the others are checked.
     Status Construct(const date::DateTime& fields, std::string_view zone);
-    // Takes a value of any type: parts that the type lacks are dropped, and a zone is added or resolved as the type asks.
-    // Error 1878 when the value lacks a date and the type has one.
+    // Takes a value of any type: parts that the type lacks are dropped, and a zone is added or resolved as the type
+    // asks. Error 1878 when the value lacks a date and the type has one.
     Status Store(const date::DateTime& value);
     Status Assign(const DateTimeDescriptor& from);
 

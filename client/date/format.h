@@ -1,5 +1,5 @@
-// Dates and times to and from text by a format model: YYYY MON DD HH24 and so on, and the names of months and days in the
-// languages the library knows. Texts and models are UTF-8.
+// Dates and times to and from text by a format model: YYYY MON DD HH24 and so on, and the names of months and days in
+// the languages the library knows. Texts and models are UTF-8.
 #pragma once
 
 #include <cstddef>

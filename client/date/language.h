@@ -1,4 +1,5 @@
-// What a language says for months, days and dates. Names are UTF-8 and in small letters; a model says how they are written.
+// What a language says for months, days and dates. Names are UTF-8 and in small letters; a model says how they are
+// written.
 #pragma once
 
 #include <array>

@@ -16,7 +16,8 @@ struct Row {
     std::uint8_t traits;
 };
 
-// Order matters: an element is the first row that the model goes on with, so longer names stand before their beginnings.
+// Order matters: an element is the first row that the model goes on with, so longer names stand before their
+// beginnings.
 constexpr Row kRows[] = {
     {"A.D.", Field::era, 0, kDotted},
     {"AD", Field::era, 0, kPlain},

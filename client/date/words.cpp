@@ -7,9 +7,10 @@ namespace date {
 namespace {
 
 constexpr std::string_view kSmall[] = {
-    "zero", "one", "two", "three", "four", "five", "six", "seven", "eight", "nine", "ten", "eleven", "twelve", "thirteen",
-    "fourteen", "fifteen", "sixteen", "seventeen", "eighteen", "nineteen"};
-constexpr std::string_view kTens[] = {"", "", "twenty", "thirty", "forty", "fifty", "sixty", "seventy", "eighty", "ninety"};
+    "zero", "one", "two", "three", "four", "five", "six", "seven", "eight", "nine", "ten", "eleven", "twelve",
+    "thirteen", "fourteen", "fifteen", "sixteen", "seventeen", "eighteen", "nineteen"};
+constexpr std::string_view kTens[] = {"",      "",      "twenty",  "thirty", "forty",
+                                      "fifty", "sixty", "seventy", "eighty", "ninety"};
 
 // Endings that do not simply get a "th".
 constexpr struct { std::string_view cardinal, ordinal; } kOrdinals[] = {

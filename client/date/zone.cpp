@@ -41,12 +41,13 @@ std::optional<ZoneRules> LoadFile(const std::string& path) {
 
 // A name of letters, digits, + - _ in parts that do not begin with anything else, so that no path leads elsewhere.
 bool IsRegionName(std::string_view name) {
+    if (name.size() > 64) return false;
     bool part_start = true;
     for (const char c : name) {
         if (c == '/' ? part_start : !IsLetter(c) && !IsDigit(c) && c != '+' && c != '-' && c != '_') return false;
         part_start = c == '/';
     }
-    return !name.empty() && name.size() <= 64 && !part_start;
+    return !name.empty() && !part_start;
 }
 
 struct Region {
@@ -59,11 +60,11 @@ class Regions {
 public:
     // 0: unknown.
     std::uint16_t Find(std::string_view name) {
+        if (!IsRegionName(name)) return 0;
         {
             const std::shared_lock lock(mutex_);
             if (const auto found = numbers_.find(name); found != numbers_.end()) return found->second;
         }
-        if (!IsRegionName(name)) return 0;
         std::optional<ZoneRules> rules = LoadFile(kZoneDirectory + std::string(name));
         if (!rules) return 0;
         const std::unique_lock lock(mutex_);
@@ -113,8 +114,10 @@ const ZoneRules& ProcessZone() {
     return *rules;
 }
 
+int SecondOfDay(const DateTime& value) { return (value.hour * 60 + value.minute) * 60 + value.second; }
+
 std::int64_t WallSeconds(const DateTime& value) {
-    return (ToDayNumber(value) - kEpochDay) * std::int64_t{86400} + (value.hour * 60 + value.minute) * 60 + value.second;
+    return (ToDayNumber(value) - kEpochDay) * std::int64_t{86400} + SecondOfDay(value);
 }
 
 // Offsets are kept in minutes; before 1900 zones had seconds, which are rounded.
@@ -133,7 +136,7 @@ std::int64_t MomentSeconds(const DateTime& value) {
 }
 
 Errno MoveSeconds(std::int64_t seconds, DateTime* value) {
-    seconds += (value->hour * 60 + value->minute) * 60 + value->second;
+    seconds += SecondOfDay(*value);
     const std::int64_t second_of_day = (seconds % 86400 + 86400) % 86400;
     if (const Errno number = AddDays(*value, (seconds - second_of_day) / 86400, value)) return number;
     value->hour = static_cast<std::uint8_t>(second_of_day / 3600);

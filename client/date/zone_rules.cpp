@@ -83,17 +83,19 @@ private:
         return true;
     }
 
+    // Month, week and weekday.
+    bool WeekdayOfMonth(RecurringRules::Change* change) {
+        if (!Number(&change->month) || change->month < 1 || change->month > 12 || !Take('.')) return false;
+        if (!Number(&change->week) || change->week < 1 || change->week > 5 || !Take('.')) return false;
+        return Number(&change->weekday) && change->weekday <= 6;
+    }
+
     bool Change(RecurringRules::Change* change) {
         using Kind = RecurringRules::Change::Kind;
         if (!Take(',')) return false;
         if (Take('M')) {
             change->kind = Kind::weekday_of_month;
-            if (!Number(&change->month) || !Take('.') || !Number(&change->week) || !Take('.') || !Number(&change->weekday)) {
-                return false;
-            }
-            if (change->month < 1 || change->month > 12 || change->week < 1 || change->week > 5 || change->weekday > 6) {
-                return false;
-            }
+            if (!WeekdayOfMonth(change)) return false;
         } else {
             change->kind = Take('J') ? Kind::day_without_leap : Kind::day;
             if (!Number(&change->day) || change->day > 365) return false;

@@ -1,6 +1,6 @@
-// The rules of one time zone: which offset from Greenwich holds at a moment. Read from compiled zone files (RFC 8536) or
-// from a rule text as the variable TZ has it. Moments are seconds since 1970 at Greenwich; wall times are the seconds
-// that a clock there would show, counted alike.
+// The rules of one time zone: which offset from Greenwich holds at a moment. Read from compiled zone files (RFC 8536)
+// or from a rule text as the variable TZ has it. Moments are seconds since 1970 at Greenwich; wall times are the
+// seconds that a clock there would show, counted alike.
 #pragma once
 
 #include <cstdint>

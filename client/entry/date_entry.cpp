@@ -3,55 +3,35 @@
 
 #include "date/date.h"
 #include "date/format.h"
+#include "entry/text_argument.h"
 #include "handles/gate.h"
 
 namespace {
 
-constexpr int kTextTooLong = 1877;
 constexpr int kMalformedText = 24501;
-constexpr std::size_t kLongestText = 4000;    // bytes of any text here; what claims more is not read
-
-// A text argument that may be missing.
-class OptionalText {
-public:
-    OptionalText(const Environment& environment, const OraText* text, std::size_t length)
-        : given_(text != nullptr && length > 0), too_long_(length > kLongestText),
-          text_(environment, text, too_long_ ? 0 : length) {}
-
-    [[nodiscard]] date::Errno Problem() const {
-        if (given_ && too_long_) return kTextTooLong;
-        return text_.Valid() ? 0 : kMalformedText;
-    }
-    [[nodiscard]] std::string_view Or(std::string_view otherwise) const { return given_ ? text_.View() : otherwise; }
-
-private:
-    bool given_;
-    bool too_long_;
-    TextIn text_;
-};
 
 // What both text functions take beside the text: the model and the language.
 class ModelArguments {
 public:
-    ModelArguments(const Environment& environment, const OraText* model, std::size_t model_length, const OraText* language,
-                   std::size_t language_length)
-        : model_(environment, model, model_length), language_(environment, language, language_length) {}
+    ModelArguments(const Environment& environment, const OraText* model, std::size_t model_length,
+                   const OraText* language, std::size_t language_length)
+        : model_(environment, model, model_length, false), language_(environment, language, language_length, false) {}
 
     date::Errno Resolve() {
-        if (const int number = model_.Problem()) return number;
-        if (const int number = language_.Problem()) return number;
-        const std::string_view name = language_.Or({});
-        known_ = name.empty() ? &date::kEnglish : date::FindLanguage(name);
+        if (!model_.Valid() || !language_.Valid()) return kMalformedText;
+        if (!language_.View().empty()) known_ = date::FindLanguage(language_.View());
         return known_ ? 0 : date::kBadLanguage;
     }
 
-    [[nodiscard]] std::string_view Model() const { return model_.Or(date::kShortDateModel); }
+    [[nodiscard]] std::string_view Model() const {
+        return model_.View().empty() ? date::kShortDateModel : model_.View();
+    }
     [[nodiscard]] const date::Language& Language() const { return *known_; }
 
 private:
-    OptionalText model_;
-    OptionalText language_;
-    const date::Language* known_ = nullptr;
+    TextArgument model_;
+    TextArgument language_;
+    const date::Language* known_ = &date::kEnglish;
 };
 
 // A date made from a date: change(value, result).
@@ -80,8 +60,8 @@ sword MeasureDates(OCIError* err, const OCIDate* left, const OCIDate* right, Num
 }
 
 // Writes into the application's area; the length is set to the text's, or to what would be needed.
-Status WriteText(const Environment& environment, const date::DateTime& value, const ModelArguments& arguments, ub4* size,
-                 OraText* out) {
+Status WriteText(const Environment& environment, const date::DateTime& value, const ModelArguments& arguments,
+                 ub4* size, OraText* out) {
     std::string text(256, '\0');
     std::size_t length = 0;
     auto write = [&] {
@@ -98,7 +78,9 @@ Status WriteText(const Environment& environment, const date::DateTime& value, co
     const std::string_view shown = TextOut(environment, std::string_view(text).substr(0, length), converted);
     const ub4 room = *size;
     *size = static_cast<ub4>(shown.size());
-    if (shown.size() > room) return Error(date::kTextBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
+    if (shown.size() > room) {
+        return Error(date::kTextBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
+    }
     shown.copy(reinterpret_cast<char*>(out), shown.size());
     return {};
 }
@@ -106,7 +88,8 @@ Status WriteText(const Environment& environment, const date::DateTime& value, co
 }  // namespace
 
 sword OCIDateAddDays(OCIError* err, const OCIDate* given, sb4 days, OCIDate* out) {
-    return MakeDate(err, given, out, [days](const auto& value, auto* result) { return date::AddDays(value, days, result); });
+    return MakeDate(err, given, out,
+                    [days](const auto& value, auto* result) { return date::AddDays(value, days, result); });
 }
 
 sword OCIDateAddMonths(OCIError* err, const OCIDate* given, sb4 months, OCIDate* out) {
@@ -125,10 +108,10 @@ sword OCIDateLastDay(OCIError* err, const OCIDate* given, OCIDate* out) {
 sword OCIDateNextDay(OCIError* err, const OCIDate* given, const OraText* day, ub4 dayLen, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
         if (!given || !day || !out) return Error(kNullArgument);
-        const OptionalText name(error.Env(), day, dayLen);
-        if (const int number = name.Problem()) return Error(number);
+        const TextArgument name(error.Env(), day, dayLen, false);
+        if (!name.Valid()) return Error(kMalformedText);
         int day_of_week = 0;
-        if (const int number = date::WeekdayFromName(name.Or({}), date::kEnglish, &day_of_week)) return Error(number);
+        if (const int number = date::WeekdayFromName(name.View(), date::kEnglish, &day_of_week)) return Error(number);
         date::DateTime result;
         if (const int number = date::NextDay(date::FromOciDate(*given), day_of_week, &result)) return Error(number);
         date::ToOciDate(result, out);
@@ -160,17 +143,17 @@ sword OCIDateSysDate(OCIError* err, OCIDate* out) {
     });
 }
 
-sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraText* fmt, ub1 fmtLen, const OraText* lang,
-                      ub4 langLen, OCIDate* out) {
+sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraText* fmt, ub1 fmtLen,
+                      const OraText* lang, ub4 langLen, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
         if (!str || !out) return Error(kNullArgument);
-        const OptionalText text(error.Env(), str, strLen);
-        if (const int number = text.Problem()) return Error(number);
+        const TextArgument text(error.Env(), str, strLen, false);
+        if (!text.Valid()) return Error(kMalformedText);
         ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
         if (const int number = arguments.Resolve()) return Error(number);
         date::DateTime value;
         if (const int number =
-                date::FromText(text.Or({}), arguments.Model(), arguments.Language(), date::Scope::date, &value)) {
+                date::FromText(text.View(), arguments.Model(), arguments.Language(), date::Scope::date, &value)) {
             return Error(number);
         }
         date::ToOciDate(value, out);
@@ -178,8 +161,8 @@ sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraTe
     });
 }
 
-sword OCIDateToText(OCIError* err, const OCIDate* given, const OraText* fmt, ub1 fmtLen, const OraText* lang, ub4 langLen,
-                    ub4* bufsize, OraText* buf) {
+sword OCIDateToText(OCIError* err, const OCIDate* given, const OraText* fmt, ub1 fmtLen, const OraText* lang,
+                    ub4 langLen, ub4* bufsize, OraText* buf) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
         if (!given || !bufsize || !buf) return Error(kNullArgument);
         const date::DateTime value = date::FromOciDate(*given);

@@ -1,12 +1,13 @@
-// The datetime package: calls on datetime descriptors. Each published function and its twin whose name ends in NS do the
-// same. Fractions are microseconds, or nanoseconds when kelpcli.ini says so.
+// The datetime package: calls on datetime descriptors. Each published function and its twin whose name ends in NS do
+// the same. Fractions are microseconds, or nanoseconds when kelpcli.ini says so.
 #include "date/descriptor.h"
 #include "date/fraction.h"
+#include "entry/text_argument.h"
 #include "handles/gate.h"
 
 namespace {
 
-constexpr std::size_t kLongestZone = 256;    // bytes of a zone's text; what claims more is not read
+constexpr int kMalformedText = 24501;
 
 // A descriptor that is no living one is refused like any bad handle; null is a missing argument.
 Status FindDescriptor(const OCIDateTime* pointer, DateTimeDescriptor*& descriptor) {
@@ -35,14 +36,6 @@ sword EnterDateTimes(void* handle, OCIError* err, const OCIDateTime* first, cons
     });
 }
 
-Status ReadZone(const Environment& environment, const OraText* text, std::size_t length, std::string& zone) {
-    if (text && length > kLongestZone) return Error(1857);
-    const TextIn given(environment, text, length);
-    if (!given.Valid()) return Error(24501);
-    zone = given.View();
-    return {};
-}
-
 }  // namespace
 
 sword OCIDateTimeAssign(dvoid* hndl, OCIError* err, const OCIDateTime* from, OCIDateTime* to) {
@@ -63,14 +56,13 @@ sword OCIDateTimeCompare(dvoid* hndl, OCIError* err, const OCIDateTime* date1, c
     });
 }
 
-sword OCIDateTimeConstruct(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 year, ub1 month, ub1 day, ub1 hour, ub1 min,
-                           ub1 sec, ub4 fsec, OraText* tz, size_t tzLen) {
-    return EnterDateTime(hndl, err, date, [&](const Environment& environment, DateTimeDescriptor& descriptor) -> Status {
+sword OCIDateTimeConstruct(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 year, ub1 month, ub1 day, ub1 hour,
+                           ub1 min, ub1 sec, ub4 fsec, OraText* tz, size_t tzLen) {
+    return EnterDateTime(hndl, err, date, [&](Environment& environment, DateTimeDescriptor& descriptor) -> Status {
         date::DateTime fields{.year = year, .month = month, .day = day, .hour = hour, .minute = min, .second = sec};
         if (!date::FractionToNanoseconds(fsec, &fields.nanosecond)) return Error(date::kBadFraction);
-        std::string zone;
-        Status read = ReadZone(environment, tz, tzLen, zone);
-        return read.Ok() ? descriptor.Construct(fields, zone) : read;
+        const TextArgument zone(environment, tz, tzLen, false);
+        return zone.Valid() ? descriptor.Construct(fields, zone.View()) : Error(kMalformedText);
     });
 }
 

@@ -124,7 +124,9 @@ sword OCIStringAssignText(OCIEnv* env, OCIError* err, const OraText* rhs, ub4 rh
     return AssignBytes(env, err, rhs, rhsLen, lhs);
 }
 
-sword OCIStringResize(OCIEnv* env, OCIError* err, ub4 newSize, OCIString** string) { return Resize(env, err, newSize, string); }
+sword OCIStringResize(OCIEnv* env, OCIError* err, ub4 newSize, OCIString** string) {
+    return Resize(env, err, newSize, string);
+}
 
 sword OCIStringAllocSize(OCIEnv* env, OCIError* err, const OCIString* string, ub4* size) {
     return GetRoom(env, err, string, size);
@@ -134,7 +136,9 @@ OraText* OCIStringPtr(OCIEnv* env, const OCIString* string) { return static_cast
 
 ub4 OCIStringSize(OCIEnv* env, const OCIString* string) { return Size(env, string); }
 
-sword OCIRawAssignRaw(OCIEnv* env, OCIError* err, const OCIRaw* rhs, OCIRaw** lhs) { return AssignObject(env, err, rhs, lhs); }
+sword OCIRawAssignRaw(OCIEnv* env, OCIError* err, const OCIRaw* rhs, OCIRaw** lhs) {
+    return AssignObject(env, err, rhs, lhs);
+}
 
 sword OCIRawAssignBytes(OCIEnv* env, OCIError* err, const ub1* rhs, ub4 rhsLen, OCIRaw** lhs) {
     return AssignBytes(env, err, rhs, rhsLen, lhs);
@@ -149,5 +153,5 @@ ub1* OCIRawPtr(OCIEnv* env, const OCIRaw* raw) { return static_cast<ub1*>(Conten
 ub4 OCIRawSize(OCIEnv* env, const OCIRaw* raw) { return Size(env, raw); }
 
 sword OCIRowidToChar(OCIRowid* rid, OraText* buf, ub2* len, OCIError* err) {
-    return Enter<RowIdDescriptor>(rid, err, [&](const RowIdDescriptor& descriptor) { return RowIdText(descriptor, buf, len); });
+    return Enter<RowIdDescriptor>(rid, err, [&](const RowIdDescriptor& row) { return RowIdText(row, buf, len); });
 }

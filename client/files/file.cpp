@@ -34,7 +34,8 @@ Status SystemError(const std::string& name, int error) {
 
 Status InvalidArgument(const char* what) { return Error(kInvalidFileArgument, what); }
 
-constexpr const char* kStreamModes[] = {nullptr, "r", "w", "r+"};    // by open mode; what is appended is the descriptor's care
+// By open mode; where appended data goes is the descriptor's care.
+constexpr const char* kStreamModes[] = {nullptr, "r", "w", "r+"};
 constexpr int kAccessModes[] = {0, O_RDONLY, O_WRONLY, O_RDWR};
 
 int OpenFlags(std::uint32_t mode, std::uint32_t create) {
@@ -129,12 +130,13 @@ Status File::Write(const void* data, std::uint32_t size, std::uint32_t* count) {
 Status File::Seek(std::uint32_t origin, std::uint64_t offset, int direction) {
     const std::lock_guard lock(mutex_);
     if (origin < OCI_FILE_SEEK_BEGINNING || origin > OCI_FILE_SEEK_END) return InvalidArgument("unknown seek origin");
-    if (direction != OCI_FILE_FORWARD && direction != OCI_FILE_BACKWARD) return InvalidArgument("unknown seek direction");
-    if (offset > static_cast<std::uint64_t>(std::numeric_limits<off_t>::max())) return InvalidArgument("offset too large");
+    const bool forward = direction == OCI_FILE_FORWARD;
+    if (!forward && direction != OCI_FILE_BACKWARD) return InvalidArgument("unknown seek direction");
+    if (offset > std::uint64_t{std::numeric_limits<std::int64_t>::max()}) return InvalidArgument("offset too large");
     constexpr int kOrigins[] = {0, SEEK_SET, SEEK_CUR, SEEK_END};
     const auto distance = static_cast<off_t>(offset);
     last_ = Last::other;
-    if (fseeko(stream_, direction == OCI_FILE_FORWARD ? distance : -distance, kOrigins[origin]) == 0) return {};
+    if (fseeko(stream_, forward ? distance : -distance, kOrigins[origin]) == 0) return {};
     return SystemError(name_, errno);
 }
 

@@ -1,5 +1,5 @@
-// Open files of the file package, and what can be asked of a file by its name. Errors carry the package's number and the
-// system's own words.
+// Open files of the file package, and what can be asked of a file by its name. Errors carry the package's number and
+// the system's own words.
 #pragma once
 
 #include <cstdint>

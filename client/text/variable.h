@@ -1,5 +1,6 @@
-// Strings and raws: values of any length that the library keeps for the application. They belong to their environment and
-// their memory comes from it. A string holds its text in the application's form, so UTF-16 where the environment has that.
+// Strings and raws: values of any length that the library keeps for the application. They belong to their environment
+// and their memory comes from it. A string holds its text in the application's form: UTF-16 where the environment has
+// that.
 #pragma once
 
 #include <cstdint>

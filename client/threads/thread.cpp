@@ -66,7 +66,8 @@ public:
 
 private:
     std::vector<KeyValue>::iterator Find(const KeyState& key) {
-        return std::find_if(values_.begin(), values_.end(), [&key](const KeyValue& value) { return value.key.get() == &key; });
+        return std::find_if(values_.begin(), values_.end(),
+                            [&key](const KeyValue& value) { return value.key.get() == &key; });
     }
 
     std::shared_ptr<ThreadState> state_;
@@ -84,7 +85,7 @@ pthread_key_t RecordKey() {
     return key;
 }
 
-// The functions of keys may use the package, so the record, which the system has taken away, stands until they are done.
+// The functions of keys may use the package: the record, which the system has taken away, stands until they are done.
 void EndRecord(void* given) {
     const std::unique_ptr<ThreadRecord> record(static_cast<ThreadRecord*>(given));
     pthread_setspecific(RecordKey(), given);

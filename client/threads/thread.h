@@ -1,5 +1,5 @@
-// The thread package: mutexes, keys, identifiers, handles and threads. Everything here may be used from any thread at any
-// time; destroying an object that another thread is about to use is the application's mistake.
+// The thread package: mutexes, keys, identifiers, handles and threads. Everything here may be used from any thread at
+// any time; destroying an object that another thread is about to use is the application's mistake.
 #pragma once
 
 #include <atomic>
@@ -47,8 +47,8 @@ struct KeyState {
     std::atomic<bool> alive{true};
 };
 
-// A value for each thread, at first null. When a thread ends with a value, the key's function is called with it; the main
-// thread does not end before the process.
+// A value for each thread, at first null. When a thread ends with a value, the key's function is called with it; the
+// main thread does not end before the process.
 class ThreadKey : public Object {
 public:
     static constexpr Kind kKind = Kind::thread_key;

@@ -41,7 +41,8 @@ bool FromText(std::string_view text, RowId* value) noexcept {
     text = WithoutBlanks(text);
     std::uint64_t table = 0, row = 0;
     if (text.size() != kTextLength) return false;
-    if (!TakeDigits(text.substr(0, kTableDigits), 32, &table) || !TakeDigits(text.substr(kTableDigits), 64, &row)) return false;
+    if (!TakeDigits(text.substr(0, kTableDigits), 32, &table)) return false;
+    if (!TakeDigits(text.substr(kTableDigits), 64, &row)) return false;
     *value = {static_cast<std::uint32_t>(table), static_cast<std::int64_t>(row)};
     return true;
 }
@@ -50,7 +51,8 @@ bool ToBytes(const RowId& value, std::uint8_t* bytes) noexcept {
     if (value.table > 0xFFFF) return false;
     bytes[0] = static_cast<std::uint8_t>(value.table >> 8);
     bytes[1] = static_cast<std::uint8_t>(value.table);
-    for (unsigned i = 0; i < 8; ++i) bytes[2 + i] = static_cast<std::uint8_t>(static_cast<std::uint64_t>(value.row) >> (56 - 8 * i));
+    const auto row = static_cast<std::uint64_t>(value.row);
+    for (unsigned i = 0; i < 8; ++i) bytes[2 + i] = static_cast<std::uint8_t>(row >> (56 - 8 * i));
     return true;
 }
 
