@@ -1,3 +1,4 @@
+// The words of all commands with their codes, and the lookup by what a typed word begins.
 #include "core/command_table.h"
 
 #include <cctype>

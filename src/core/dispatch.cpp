@@ -1,3 +1,4 @@
+// Finds the command that a line names, checks its word count and runs its handler.
 #include "core/dispatch.h"
 
 #include "commands/families.h"

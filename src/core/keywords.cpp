@@ -1,3 +1,4 @@
+// Decoding of symbolic words, alone and joined, and of plain numbers.
 #include "core/keywords.h"
 
 #include <strings.h>

@@ -1,3 +1,4 @@
+// The one writer: formats to standard output, flushes the stream a message is meant for.
 #include "core/messages.h"
 
 #include <cstdarg>

@@ -1,3 +1,4 @@
+// Reading levels: physical lines joined to command lines, echoed, tokenized and dispatched; scripts within scripts.
 #include "core/script.h"
 
 #include <sys/resource.h>

@@ -1,3 +1,4 @@
+// The process-wide handles, modes and flags, as they are at start-up.
 #include "core/state.h"
 
 OCIEnv* DefaultEnvironment = nullptr;

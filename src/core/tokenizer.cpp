@@ -1,3 +1,4 @@
+// The scanner of a command line, and the token buffers its words are copied to.
 #include "core/tokenizer.h"
 
 #include <cctype>

@@ -1,3 +1,4 @@
+// The table of memory buffers: element sizes by type, the blocks of a buffer, numbers that begin as zero.
 #include "objects/buffers.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// Texts into decimal64 and decimal128: digits read one by one, rounded, brought into range, encoded.
 #include <cctype>
 #include <charconv>
 #include <cstring>

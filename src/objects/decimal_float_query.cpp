@@ -1,3 +1,4 @@
+// Decimal floats into texts: one statement that casts the bound value, run on the server.
 #include "objects/decimal_float.h"
 
 #include <algorithm>

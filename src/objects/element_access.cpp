@@ -1,3 +1,4 @@
+// The 7-byte date and the date literal.
 #include "objects/element_access.h"
 
 #include <cctype>

@@ -1,3 +1,4 @@
+// Texts into the library's numbers, in UTF-16 where the environment wants it.
 #include "objects/library_number.h"
 
 #include <string>

@@ -1,3 +1,4 @@
+// Tagged blocks of the platform, with the complaint when there is none to be had.
 #include "objects/memory.h"
 
 #include "core/messages.h"

@@ -1,3 +1,4 @@
+// The kinds and their slots, and the one search, registration and release for all of them.
 #include "objects/registry.h"
 
 #include <algorithm>

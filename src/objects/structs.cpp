@@ -1,3 +1,4 @@
+// The table of memory structs, and what a buffer or a member supplies to binds and defines.
 #include "objects/structs.h"
 
 #include "core/keywords.h"

@@ -1,3 +1,4 @@
+// Conversion over the code-page service, with its messages; text arguments made ready for the library.
 #include "objects/text_conversion.h"
 
 #include <algorithm>

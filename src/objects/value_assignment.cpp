@@ -1,3 +1,4 @@
+// One table from type to the function that stores a text as that type.
 #include "objects/value_assignment.h"
 
 #include <algorithm>

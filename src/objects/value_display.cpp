@@ -1,3 +1,4 @@
+// One table from type to the function that shows an element of that type.
 #include "objects/value_display.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// Normalising of diagnostic texts.
 #include "report/diagnostics.h"
 
 #include <cstring>

@@ -1,3 +1,4 @@
+// Names of return codes, and the loop over the records of a handle.
 #include "report/return_code.h"
 
 #include <cstring>

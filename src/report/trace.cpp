@@ -1,3 +1,4 @@
+// One table from command code to function name and label.
 #include "report/trace.h"
 
 #include "core/messages.h"
