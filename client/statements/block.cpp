@@ -147,6 +147,7 @@ void Statement::TakeResult(std::unique_ptr<engine::Query> query, const std::shar
     Drop();
     Use(link);
     cursor_.Open(std::move(query));
+    ++link->open_statements;
     state_ = State::executed;
     described_ = true;
     failed_ = cancelled_ = link_lost_ = false;

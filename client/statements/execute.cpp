@@ -50,7 +50,7 @@ Status Statement::Execute(ServiceContext& service, ErrorHandle& error, const Exe
     if (arguments.mode & OCI_PARSE_ONLY) return ParseOnly();
     if (arguments.mode & OCI_DESCRIBE_ONLY) return DescribeOnly();
 
-    cursor_.Close();
+    CloseCursor();
     state_ = State::initialized;
     row_count_ = 0;
     rows_fetched_ = failed_rows_ = 0;
@@ -156,6 +156,8 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
     }
     if (Status status = compiled->query->Open(rows, 0); !status.Ok()) return status;
     cursor_.Open(*compiled->query, arguments.mode & OCI_STMT_SCROLLABLE_READONLY);
+    ++UsedLink()->open_statements;
+    defines_changed_ = true;    // the first row may have told more of the columns
     state_ = State::executed;
     return arguments.iterations > 0 ? FetchAtExecute(arguments) : Status();
 }
@@ -163,6 +165,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
 // The rows that the execute itself delivers; elements count from the row offset. An exact fetch looks one row further.
 Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     const ub4 rows = arguments.iterations - arguments.first;
+    if (Status status = ActivateDefines(); !status.Ok()) return status;
     if (fetches_in_pieces_) return StartFetchInPieces(rows, false, true);
     Status status = FetchRows(rows, arguments.first, false);
     if (!(arguments.mode & OCI_EXACT_FETCH)) return status;
@@ -170,7 +173,7 @@ Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     if (!status.Failed() && status.Code() != OCI_NO_DATA) {
         if (Status next = cursor_.Next(more); !next.Ok()) status = std::move(next);
     }
-    cursor_.Close();
+    CloseCursor();
     state_ = State::end_of_fetch;
     return more ? Error(kTooManyRows) : status;
 }

@@ -35,7 +35,7 @@ Status Statement::Fetch(ub4 rows, ub2 orientation, sb4 offset) {
     rows_fetched_ = 0;
     if (Status status = CheckFetch(); !status.Ok()) return status;
     if (rows == 0) {
-        cursor_.Close();
+        CloseCursor();
         cancelled_ = true;
         return {};
     }

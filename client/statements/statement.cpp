@@ -50,7 +50,7 @@ void Statement::LinkClosed() noexcept {
 }
 
 void Statement::Drop() noexcept {
-    cursor_.Close();
+    CloseCursor();
     pieces_ = {};
     compiled_.clear();
 }
@@ -77,8 +77,14 @@ void Statement::ReleaseDefines() noexcept {
     defined_.clear();
 }
 
-void Statement::Rest() noexcept {
+// The session counts its open results.
+void Statement::CloseCursor() noexcept {
+    if (cursor_.IsOpen()) --UsedLink()->open_statements;
     cursor_.Close();
+}
+
+void Statement::Rest() noexcept {
+    CloseCursor();
     pieces_ = {};
     state_ = State::initialized;
     described_ = failed_ = cancelled_ = false;
@@ -125,6 +131,7 @@ Status Statement::MakeBind(OCIBind** handle, const BindArguments& arguments, Bin
         if (is_new) Destroy(bind);
         return status;
     }
+    pieces_ = {};    // an operation that waits for a piece is given up
     if (bind->statement) bind->statement->Forget(*bind);
     bind->statement = this;
     bind->most_elements = arguments.most_elements;
@@ -199,9 +206,12 @@ Status Statement::DefineByPosition(OCIDefine** handle, ub4 position, const AreaA
         if (is_new) Destroy(define);
         return status;
     }
+    pieces_ = {};
     if (define->statement) define->statement->Forget(*define);
     if (defined_.size() < position) defined_.resize(position);
-    if (Define* before = std::exchange(defined_[position - 1], define)) before->statement = nullptr;
+    Define* before = std::exchange(defined_[position - 1], define);
+    if (before) before->statement = nullptr;
+    if (before && before->Parent() == this) Destroy(before);
     define->statement = this;
     define->position = position;
     defines_changed_ = true;

@@ -158,6 +158,7 @@ private:
     void ReleaseDefines() noexcept;
     const std::string& KeptName(std::size_t placeholder, bool indicator);
     void Drop() noexcept;    // what is compiled and open
+    void CloseCursor() noexcept;
 
     // execute.cpp
     engine::Connection& Engine() const { return UsedLink()->Engine(); }
