@@ -22,31 +22,43 @@ constexpr int kDigits = 38;
 constexpr mpfr_prec_t kFloatBits = 133;     // 40 digits
 constexpr mpfr_prec_t kFunctionBits = 160;  // and what it takes to round them
 
-// Nanoseconds an operation, in the best of a few rounds.
-template <class Work> double Nanoseconds(int count, Work work) {
-    double best = 1e300;
-    for (int round = 0; round < 5; ++round) {
-        const auto start = std::chrono::steady_clock::now();
-        for (int i = 0; i < count; ++i) work(i);
-        const std::chrono::duration<double, std::nano> elapsed = std::chrono::steady_clock::now() - start;
-        best = std::min(best, elapsed.count() / count);
-    }
-    return best;
+// Nanoseconds an operation, over one short slice.
+template <class Work> double Slice(int count, Work& work) {
+    const auto start = std::chrono::steady_clock::now();
+    for (int i = 0; i < count; ++i) work(i);
+    const std::chrono::duration<double, std::nano> elapsed = std::chrono::steady_clock::now() - start;
+    return elapsed.count() / count;
+}
+
+double Median(std::vector<double> values) {
+    std::sort(values.begin(), values.end());
+    return values[values.size() / 2];
 }
 
 int runs = 5;
 
-template <class Ours, class Theirs> void Pair(const char* what, double goal, int count, Ours ours, Theirs theirs) {
-    std::vector<double> ratios;
-    double mine = 0, other = 0;
-    for (int run = 0; run < runs; ++run) {
-        mine = Nanoseconds(count, ours);
-        other = Nanoseconds(count, theirs);
-        ratios.push_back(mine / other);
-    }
-    std::sort(ratios.begin(), ratios.end());
-    std::printf("%-52s %6.2f x  (goal %.1f)  %8.1f ns, %8.1f ns\n", what, ratios[ratios.size() / 2], goal, mine, other);
+constexpr int kSlicesPerRun = 100;
+
+void Report(const char* what, double goal, double ratio, double ours, double theirs) {
+    std::printf("%-52s %6.2f x  (goal %.1f)  %8.1f ns, %8.1f ns\n", what, ratio, goal, ours, theirs);
     std::fflush(stdout);
+}
+
+// Short slices in turn, so that what else the machine does meets both; the median of the ratios slice by slice.
+template <class Ours, class Theirs> void Pair(const char* what, double goal, int count, Ours ours, Theirs theirs) {
+    std::vector<double> ratios, mine, other;
+    for (int slice = 0; slice < runs * kSlicesPerRun; ++slice) {
+        mine.push_back(Slice(count, ours));
+        other.push_back(Slice(count, theirs));
+        ratios.push_back(mine.back() / other.back());
+    }
+    Report(what, goal, Median(ratios), Median(mine), Median(other));
+}
+
+template <class Work> double Nanoseconds(int count, Work work) {
+    std::vector<double> slices;
+    for (int slice = 0; slice < runs * kSlicesPerRun; ++slice) slices.push_back(Slice(count, work));
+    return Median(slices);
 }
 
 // Digits that begin and end with one that is not 0.
@@ -92,7 +104,7 @@ void BesideGmp(const Values& a, const Values& b) {
     mpf_t floating;
     mpz_init2(whole, 256);
     mpf_init2(floating, kFloatBits);
-    constexpr int kCount = 200000;
+    constexpr int kCount = 4096;
     const auto ours = [&](number::Binary function) {
         return [&, function](int i) { function(a.number[At(i)], b.number[Other(i)], &result); };
     };
@@ -133,7 +145,7 @@ void BesideMpfr(const Values& a) {
     mpfr_init2(real, kFunctionBits);
     for (const auto& row : rows)
         Pair(
-            row.what, 2, 5000, [&](int i) { row.ours(a.fraction[At(i)], &result); },
+            row.what, 2, 64, [&](int i) { row.ours(a.fraction[At(i)], &result); },
             [&](int i) { row.theirs(real, a.real[At(i)], MPFR_RNDN); });
     mpfr_clear(real);
 }
@@ -168,14 +180,14 @@ void BesidePython(const Values& a) {
         double ours;
     } rows[] = {
         {"square root / decimal", "x.sqrt()", 1,
-         Nanoseconds(20000, [&](int i) { number::Sqrt(a.number[At(i)], &result); })},
+         Nanoseconds(512, [&](int i) { number::Sqrt(a.number[At(i)], &result); })},
         {"exponential / decimal", "y.exp()", 1,
-         Nanoseconds(5000, [&](int i) { number::Exp(a.fraction[At(i)], &result); })},
-        {"logarithm / decimal", "y.ln()", 1, Nanoseconds(5000, [&](int i) { number::Ln(a.fraction[At(i)], &result); })},
+         Nanoseconds(64, [&](int i) { number::Exp(a.fraction[At(i)], &result); })},
+        {"logarithm / decimal", "y.ln()", 1, Nanoseconds(64, [&](int i) { number::Ln(a.fraction[At(i)], &result); })},
         {"number to text / decimal", "str(x)", 2,
-         Nanoseconds(50000, [&](int i) { number::ToPlainText(parsed[At(i)], '.', text, &length); })},
+         Nanoseconds(1024, [&](int i) { number::ToPlainText(parsed[At(i)], '.', text, &length); })},
         {"text to number / decimal", "D(s)", 2,
-         Nanoseconds(50000, [&](int i) { number::FromPlainText(a.text[At(i)], '.', &result); })}};
+         Nanoseconds(1024, [&](int i) { number::FromPlainText(a.text[At(i)], '.', &result); })}};
     std::vector<std::string> statements;
     for (const auto& row : rows) statements.emplace_back(row.statement);
     const std::vector<double> theirs = PythonNanoseconds(a, statements);
@@ -184,8 +196,7 @@ void BesidePython(const Values& a) {
         return;
     }
     for (std::size_t i = 0; i < theirs.size(); ++i)
-        std::printf("%-52s %6.2f x  (goal %.1f)  %8.1f ns, %8.1f ns\n", rows[i].what, rows[i].ours / theirs[i],
-                    rows[i].goal, rows[i].ours, theirs[i]);
+        Report(rows[i].what, rows[i].goal, rows[i].ours / theirs[i], rows[i].ours, theirs[i]);
 }
 
 }  // namespace

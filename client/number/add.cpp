@@ -74,6 +74,15 @@ template <bool kNegative>
     return true;
 }
 
+// left + right, or left - right when `flip` says so. Never inlined: the common case needs few registers.
+[[gnu::noinline]] Errno AddAny(const OCINumber& left, const OCINumber& right, bool flip, OCINumber* result) {
+    Digits a, b;
+    if (const Errno error = Unpack(left, &a)) return error;
+    if (const Errno error = Unpack(right, &b)) return error;
+    b.negative = b.negative != flip;
+    return AddSigned(a, b, result);
+}
+
 }  // namespace
 
 Errno Add(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
@@ -81,10 +90,7 @@ Errno Add(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
         const bool negative = left.OCINumberPart[1] < 128;
         if (negative ? AddAligned<true>(left, right, result) : AddAligned<false>(left, right, result)) return 0;
     }
-    Digits a, b;
-    if (const Errno error = Unpack(left, &a)) return error;
-    if (const Errno error = Unpack(right, &b)) return error;
-    return AddSigned(a, b, result);
+    return AddAny(left, right, false, result);
 }
 
 Errno Sub(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
@@ -93,11 +99,7 @@ Errno Sub(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
         if (negative ? SubtractAligned<true>(left, right, result) : SubtractAligned<false>(left, right, result))
             return 0;
     }
-    Digits a, b;
-    if (const Errno error = Unpack(left, &a)) return error;
-    if (const Errno error = Unpack(right, &b)) return error;
-    b.negative = !b.negative;
-    return AddSigned(a, b, result);
+    return AddAny(left, right, true, result);
 }
 
 }  // namespace number

@@ -184,9 +184,11 @@ inline void Normalize(Digits* digits) {
 }
 
 // Sets a 1 in front of the digits: what a carry out of the first one leaves.
-inline void PrependOne(Digits* digits) {
-    ShiftRight(digits, 1);
-    digits->words[0] |= 1ull << 56;
+[[gnu::always_inline]] inline void PrependOne(Digits* digits) {
+    std::uint64_t* w = digits->words;
+    w[2] = w[2] >> 8 | w[1] << 56;
+    w[1] = w[1] >> 8 | w[0] << 56;
+    w[0] = w[0] >> 8 | 1ull << 56;
     ++digits->exponent;
 }
 
