@@ -3,60 +3,24 @@
 
 #include <algorithm>
 #include <cctype>
-#include <cstdlib>
 #include <initializer_list>
-#include <optional>
+#include <utility>
 
-#include "engine/sqlite/coercion.h"
-#include "engine/sqlite/column_types.h"
-#include "engine/sqlite/connection.h"
 #include "engine/sqlite/pieces.h"
+#include "engine/sqlite/table_columns.h"
 
 namespace engine::sqlite {
 namespace {
 
 constexpr std::ptrdiff_t kExactDigits = 15;
-constexpr std::size_t kNowhere = static_cast<std::size_t>(-1);
-
-struct TableColumn {
-    std::string name;
-    std::string declared;
-    Column column;
-    bool concerned = false;    // values are looked at
-};
-
-// The columns of a table in their order; none when there is no such table.
-std::vector<TableColumn> ReadColumns(sqlite3* database, const std::string& schema, const std::string& table) {
-    std::vector<TableColumn> columns;
-    sqlite3_stmt* compiled = nullptr;
-    const char* sql = schema.empty() ? "select name, type from pragma_table_info(?1)"
-                                     : "select name, type from pragma_table_info(?1, ?2)";
-    sqlite3_prepare_v2(database, sql, -1, &compiled, nullptr);
-    const StatementHandle statement(compiled);
-    if (!compiled) return columns;
-    sqlite3_bind_text(compiled, 1, table.data(), static_cast<int>(table.size()), SQLITE_STATIC);
-    if (!schema.empty()) sqlite3_bind_text(compiled, 2, schema.data(), static_cast<int>(schema.size()), SQLITE_STATIC);
-    while (sqlite3_step(compiled) == SQLITE_ROW) {
-        TableColumn column;
-        column.name = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
-        column.declared = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 1));
-        column.concerned = ReadDeclaredType(column.declared, column.column) && Coercion::Concerns(column.column);
-        column.column.name = column.name;
-        std::transform(column.name.begin(), column.name.end(), column.column.name.begin(),
-                       [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
-        columns.push_back(std::move(column));
-    }
-    return columns;
-}
 
 class Finder {
 public:
     Finder(sqlite3* database, std::string_view sql) : database_(database), sql_(sql), pieces_(Split(sql)) {}
 
-    Assignments Find() {
+    ValueTargets Find() {
         if (Is(0, "insert") || Is(0, "replace")) Insert();
         else if (Is(0, "update")) Update();
-        if (!wraps_.empty()) Wrap();
         return std::move(result_);
     }
 
@@ -64,10 +28,6 @@ private:
     // An expression: pieces [first, last).
     struct Span {
         std::size_t first, last;
-    };
-    struct Insertion {
-        std::size_t at;    // offset in the text
-        std::string text;
     };
 
     bool Is(std::size_t index, std::string_view word) const {
@@ -89,37 +49,16 @@ private:
         return pieces_.size();
     }
 
-    // Reads "name" or "schema.name" and the table's columns; where the text goes on.
-    std::size_t Table(std::size_t at) {
-        if (at >= pieces_.size()) return at;
-        std::string schema;
-        std::string name = PlainName(pieces_[at++]);
-        if (Is(at, ".") && at + 1 < pieces_.size()) {
-            schema = std::exchange(name, PlainName(pieces_[at + 1]));
-            at += 2;
-        }
-        columns_ = ReadColumns(database_, schema, name);
-        return at;
-    }
-
-    const TableColumn* FindColumn(std::string_view piece) const {
-        const std::string name = PlainName(piece);
-        const auto found = std::find_if(columns_.begin(), columns_.end(), [&](const TableColumn& column) {
-            return sqlite3_stricmp(column.name.c_str(), name.c_str()) == 0;
-        });
-        return found == columns_.end() ? nullptr : &*found;
-    }
-
     void Insert() {
         std::size_t at = 1;
         while (at < pieces_.size() && at < 4 && !Is(at, "into")) ++at;
         if (!Is(at, "into")) return;
-        at = Table(at + 1);
+        at = ReadTable(database_, pieces_, at + 1, columns_);
         if (Is(at, "as")) at += 2;
         std::vector<const TableColumn*> targets;
         if (Is(at, "(")) {
             for (++at; at < pieces_.size() && !Is(at, ")"); ++at) {
-                if (!Is(at, ",")) targets.push_back(FindColumn(pieces_[at]));
+                if (!Is(at, ",")) targets.push_back(FindColumn(columns_, pieces_[at]));
             }
             ++at;
         } else {
@@ -170,19 +109,13 @@ private:
         return "kelp_store(" + expression + ", " + Literal(target->declared) + ", " + Literal(name) + ")";
     }
 
-    static std::string Literal(std::string_view text) {
-        std::string literal = "'";
-        for (const char c : text) literal.append(c == '\'' ? 2 : 1, c);
-        return literal += '\'';
-    }
-
     void Update() {
         std::size_t at = Is(1, "or") ? 3 : 1;
-        at = Table(at);
+        at = ReadTable(database_, pieces_, at, columns_);
         at = FindWord(at, {"set"});
         while (at < pieces_.size() && !EndsAssignments(at)) {
             const std::size_t end = FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", ";"});
-            if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(pieces_[at + 1]));
+            if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(columns_, pieces_[at + 1]));
             at = end;
         }
     }
@@ -191,21 +124,15 @@ private:
 
     void Assign(Span span, const TableColumn* target) {
         if (!target || !target->concerned || span.first >= span.last) return;
-        if (const std::size_t index = ParameterOf(span); index != kNowhere) {
-            result_.parameters.push_back({index, target->column});
+        const std::size_t index = span.last - span.first == 2 ? ParameterAt(pieces_, span.first) : kNoParameter;
+        if (index != kNoParameter) {
+            result_.parameters.push_back({index, target->column, Coercion::Purpose::store});
         } else if (!IsHarmless(span, *target)) {
             const std::string wrapped = Stored(IsLongNumber(span) ? "''" : "", target);    // kelp_store('', 'type', ...
             const std::size_t middle = wrapped.find(',') - (IsLongNumber(span) ? 1 : 0);
-            wraps_.push_back({Begin(span.first), wrapped.substr(0, middle)});
-            wraps_.push_back({End(span.last - 1), wrapped.substr(middle)});
+            result_.wraps.push_back({Begin(span.first), wrapped.substr(0, middle)});
+            result_.wraps.push_back({End(span.last - 1), wrapped.substr(middle)});
         }
-    }
-
-    // "?7" alone
-    std::size_t ParameterOf(Span span) const {
-        if (span.last - span.first != 2 || pieces_[span.first] != "?") return kNowhere;
-        const int number = std::atoi(std::string(pieces_[span.first + 1]).c_str());
-        return number > 0 ? static_cast<std::size_t>(number) - 1 : kNowhere;
     }
 
     // A literal of a number with more digits than a real keeps: it is read as text.
@@ -226,29 +153,30 @@ private:
                (target.column.precision == 0 || target.column.precision == 38);
     }
 
-    void Wrap() {
-        std::size_t copied = 0;
-        for (const Insertion& wrap : wraps_) {
-            result_.sql.append(sql_.substr(copied, wrap.at - copied)).append(wrap.text);
-            copied = wrap.at;
-        }
-        result_.sql.append(sql_.substr(copied));
-    }
-
     sqlite3* database_;
     std::string_view sql_;
     std::vector<std::string_view> pieces_;
     std::vector<TableColumn> columns_;
-    std::vector<Insertion> wraps_;
-    Assignments result_;
+    ValueTargets result_;
 };
 
 }  // namespace
 
-Assignments FindAssignments(sqlite3* database, std::string_view sql) {
+std::string ValueTargets::Rewritten(std::string_view text) const {
+    std::string rewritten = sql;
+    if (!sql.empty() || wraps.empty()) return rewritten;
+    std::size_t copied = 0;
+    for (const Wrap& wrap : wraps) {
+        rewritten.append(text.substr(copied, wrap.at - copied)).append(wrap.text);
+        copied = wrap.at;
+    }
+    return rewritten.append(text.substr(copied));
+}
+
+ValueTargets FindAssignments(sqlite3* database, std::string_view sql) {
     const std::string_view word = FirstWord(sql);
     const bool stores = IsWord(word, "insert") || IsWord(word, "replace") || IsWord(word, "update");
-    return stores ? Finder(database, sql).Find() : Assignments();
+    return stores ? Finder(database, sql).Find() : ValueTargets();
 }
 
 }  // namespace engine::sqlite

@@ -1,5 +1,6 @@
-// Which columns a statement stores into: the declared types of the targets of its placeholders, and of its other
-// expressions, whose text is then wrapped into calls of kelp_store(expression, 'declared type', 'column').
+// What the values of a statement are for: the columns that it stores them into or compares them with. Placeholders keep
+// their place, and their values are made to fit; other expressions are wrapped into calls of kelp_store(expression,
+// 'declared type', 'column') or kelp_compare(...), which do the same.
 #pragma once
 
 #include <sqlite3.h>
@@ -10,19 +11,29 @@
 #include <vector>
 
 #include "engine/engine.h"
+#include "engine/sqlite/coercion.h"
 
 namespace engine::sqlite {
 
-struct Assignments {
+struct ValueTargets {
     struct Parameter {
         std::size_t index;    // from 0
         Column column;
+        Coercion::Purpose purpose;
     };
-    std::vector<Parameter> parameters;    // that are stored as they are
-    std::string sql;                      // the statement with its other expressions wrapped; empty: nothing to wrap
+    struct Wrap {
+        std::size_t at;       // offset in the text
+        std::string text;     // what comes in there
+    };
+    std::vector<Parameter> parameters;
+    std::vector<Wrap> wraps;              // in the order of the text
+    std::string sql;                      // the statement written anew; empty: only the wraps
+
+    // The statement with its expressions wrapped; empty when it stays as it is.
+    [[nodiscard]] std::string Rewritten(std::string_view text) const;
 };
 
 // Of insert ... values, insert ... select, update ... set. Nothing for other statements and for forms not understood.
-Assignments FindAssignments(sqlite3* database, std::string_view sql);
+ValueTargets FindAssignments(sqlite3* database, std::string_view sql);
 
 }  // namespace engine::sqlite

@@ -94,6 +94,20 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
 
 }  // namespace
 
+// Without limits nothing is refused for its size.
+Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)), purpose_(purpose) {
+    if (purpose == Purpose::store) return;
+    if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) column_.type = SQLT_NUM;
+    if (IsDateType(column_.type)) return;
+    column_.size = 0;
+    column_.precision = 0;
+    column_.scale = kFloating;
+}
+
+bool Coercion::ConcernsComparison(const Column& column) {
+    return IsDateType(column.type) || IsNumberType(column.type) || column.type == SQLT_AFC || column.type == SQLT_BIN;
+}
+
 bool Coercion::Concerns(const Column& column) {
     switch (column.type) {
         case SQLT_CHR:
@@ -212,7 +226,8 @@ Status Coercion::ApplyDate(Datum& value) {
     if (value.kind != Kind::text && value.kind != Kind::timestamp) return Refuse(kInconsistentTypes);
     constexpr std::size_t kPlainDate = 19;    // "YYYY-MM-DD HH:MM:SS"
     const std::string_view text = value.Text();
-    if (value.kind == Kind::timestamp && (column_.type != SQLT_DAT || text.size() == kPlainDate)) return {};
+    const bool as_it_is = purpose_ == Purpose::compare || column_.type != SQLT_DAT || text.size() == kPlainDate;
+    if (value.kind == Kind::timestamp && as_it_is) return {};
     if (text.empty()) {
         value = {};
         return {};

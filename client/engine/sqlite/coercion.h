@@ -13,10 +13,14 @@ namespace engine::sqlite {
 
 class Coercion {
 public:
-    explicit Coercion(Column column) : column_(std::move(column)) {}
+    // A value that is compared with a column is read as the column's type, but neither rounded nor measured.
+    enum class Purpose : std::uint8_t { store, compare };
 
-    // Whether values of the column need a look at all.
+    explicit Coercion(Column column, Purpose purpose = Purpose::store);
+
+    // Whether values of the column need a look at all; whether those compared with it do.
     static bool Concerns(const Column& column);
+    static bool ConcernsComparison(const Column& column);
 
     // The Datum may point into this object afterwards, until the next call.
     Status Apply(Datum& value);
@@ -32,6 +36,7 @@ private:
     [[nodiscard]] Status Refuse(int number) const;
 
     Column column_;
+    Purpose purpose_;
     OCINumber number_{};
     std::array<char, date::kMaxEngineText> date_{};
     std::string text_;

@@ -6,6 +6,7 @@
 
 #include "engine/sqlite/accounts.h"
 #include "engine/sqlite/assignments.h"
+#include "engine/sqlite/comparisons.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/functions.h"
 #include "engine/sqlite/query.h"
@@ -100,14 +101,16 @@ Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& q
         return Error(kNotProperlyEnded).From("SQLITE");
     }
 
-    const Assignments assignments = FindAssignments(database, sql);
-    if (!assignments.sql.empty()) {
-        StatementHandle checked = Compile(assignments.sql, code, nullptr);
+    ValueTargets targets = FindAssignments(database, sql);
+    FindComparisons(database, sql, targets);
+    const std::string rewritten = targets.Rewritten(sql);
+    if (!rewritten.empty()) {
+        StatementHandle checked = Compile(rewritten, code, nullptr);
         if (code != SQLITE_OK) return Failure(database, code);
         statement = std::move(checked);
     }
     auto made = std::make_unique<SqliteQuery>(*this, std::move(statement), sql);
-    for (const auto& parameter : assignments.parameters) made->StoreInto(parameter.index, parameter.column);
+    for (const auto& parameter : targets.parameters) made->UseFor(parameter.index, parameter.column, parameter.purpose);
     query = std::move(made);
     return {};
 }

@@ -203,15 +203,17 @@ void Now(sqlite3_context* context, int, Arguments) {
     ReturnDate(context, now);
 }
 
-// store(x, 'declared type', 'column'): what a column of that type takes, or refuses. The type is read once a statement.
-void Store(sqlite3_context* context, int, Arguments arguments) {
+// store(x, 'declared type', 'column'): what a column of that type takes, or refuses; compare(x, ...): what x is when it
+// is compared with one. The type is read once a statement.
+template <Coercion::Purpose purpose>
+void Coerce(sqlite3_context* context, int, Arguments arguments) {
     auto* coercion = static_cast<Coercion*>(sqlite3_get_auxdata(context, 1));
     std::unique_ptr<Coercion> made;
     if (!coercion) {
         Column column;
         if (!ReadDeclaredType(TextOf(arguments[1]), column)) return sqlite3_result_value(context, arguments[0]);
         column.name = TextOf(arguments[2]);
-        made = std::make_unique<Coercion>(std::move(column));
+        made = std::make_unique<Coercion>(std::move(column), purpose);
         coercion = made.get();
     }
     OCINumber number;
@@ -239,7 +241,8 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_char", 1, 2, SQLITE_DETERMINISTIC, ToText<true>},
     {"kelp_date", 1, 1, SQLITE_DETERMINISTIC, ToDate<true>},
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
-    {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Store},
+    {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::store>},
+    {"kelp_compare", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::compare>},
     {"kelp_sysdate", 0, 0, 0, Now<true>},
     {"kelp_systimestamp", 0, 0, 0, Now<false>},
 };

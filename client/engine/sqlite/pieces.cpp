@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cstdlib>
 
 namespace engine::sqlite {
 namespace {
@@ -48,6 +49,12 @@ std::vector<std::string_view> Split(std::string_view sql) {
 bool IsWord(std::string_view piece, std::string_view lower) {
     return std::equal(piece.begin(), piece.end(), lower.begin(), lower.end(),
                       [](char a, char b) { return std::tolower(static_cast<unsigned char>(a)) == b; });
+}
+
+std::size_t ParameterAt(const std::vector<std::string_view>& pieces, std::size_t at) {
+    if (at + 1 >= pieces.size() || pieces[at] != "?") return kNoParameter;
+    const int number = std::atoi(std::string(pieces[at + 1]).c_str());
+    return number > 0 ? static_cast<std::size_t>(number) - 1 : kNoParameter;
 }
 
 std::string PlainName(std::string_view piece) {

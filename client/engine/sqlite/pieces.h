@@ -26,6 +26,10 @@ std::vector<std::string_view> Split(std::string_view sql);
 // Without regard to letter case; `lower` is in lower case.
 bool IsWord(std::string_view piece, std::string_view lower);
 
+// The index, from 0, of the placeholder ?7 that stands at pieces[at]; kNoParameter for anything else.
+constexpr std::size_t kNoParameter = static_cast<std::size_t>(-1);
+std::size_t ParameterAt(const std::vector<std::string_view>& pieces, std::size_t at);
+
 // A name without its quotes.
 std::string PlainName(std::string_view piece);
 

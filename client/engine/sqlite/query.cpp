@@ -32,8 +32,8 @@ SqliteQuery::SqliteQuery(SqliteConnection& connection, StatementHandle statement
 
 SqliteQuery::~SqliteQuery() { Close(); }
 
-void SqliteQuery::StoreInto(std::size_t parameter, const Column& column) {
-    if (parameter < coercions_.size()) coercions_[parameter] = std::make_unique<Coercion>(column);
+void SqliteQuery::UseFor(std::size_t parameter, const Column& column, Coercion::Purpose purpose) {
+    if (parameter < coercions_.size()) coercions_[parameter] = std::make_unique<Coercion>(column, purpose);
 }
 
 const std::vector<Column>& SqliteQuery::Columns() {

@@ -18,8 +18,8 @@ namespace engine::sqlite {
 class SqliteQuery final : public Query {
 public:
     SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql);
-    // The placeholder's values are stored into the column.
-    void StoreInto(std::size_t parameter, const Column& column);
+    // The placeholder's values are stored into the column, or compared with it.
+    void UseFor(std::size_t parameter, const Column& column, Coercion::Purpose purpose);
     ~SqliteQuery() override;
     SqliteQuery(const SqliteQuery&) = delete;
     SqliteQuery& operator=(const SqliteQuery&) = delete;
