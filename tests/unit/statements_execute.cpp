@@ -1,4 +1,9 @@
 // Executing: modes, counts, array changes and their failures, transactions, blocks.
+#include <algorithm>
+#include <atomic>
+#include <cstdlib>
+#include <thread>
+
 #include "statement_fixture.h"
 
 namespace {
@@ -261,6 +266,12 @@ TEST_F(Executing, BlockOpensResultSets) {
     }
 }
 
+// What the driver shows its decimal floats with.
+TEST_F(Executing, ValuesIsAQueryOfOneRow) {
+    EXPECT_EQ(One("values( cast( cast('1.50' as decfloat(34)) as varchar(100)))"), "1.5");
+    EXPECT_EQ(One("values(1, 2)"), "1");
+}
+
 TEST_F(Executing, BlockAssignsAndSelectsInto) {
     sb4 in = 20, out = 0;
     char text[6] = "";
@@ -310,6 +321,99 @@ TEST_F(Executing, IndexTableArguments) {
     EXPECT_EQ(doubled[0], 3);
     count = 6;
     EXPECT_EQ(Bind(1, {numbers, 4, SQLT_INT}, OCI_DEFAULT, 5, &count), 1414);
+}
+
+// ---- Under pressure
+
+struct Budget {
+    int left;
+    static dvoid* Allocate(dvoid* self, std::size_t size) {
+        return static_cast<Budget*>(self)->left-- > 0 ? std::malloc(size) : nullptr;
+    }
+    static void Release(dvoid*, dvoid* memory) { std::free(memory); }
+};
+
+// The life of a statement in memory for `budget` blocks; whether it went well to the end.
+bool LiveWith(int blocks) {
+    Budget budget{blocks};
+    OCIEnv* env = nullptr;
+    if (OCIEnvCreate(&env, OCI_DEFAULT, &budget, Budget::Allocate, nullptr, Budget::Release, 0, nullptr) != OCI_SUCCESS) return false;
+    OCIError* err = nullptr;
+    OCISvcCtx* svc = nullptr;
+    OCIStmt* stmt = nullptr;
+    OCIStmt* cursor = nullptr;
+    OCIBind* bind = nullptr;
+    OCIDefine* define = nullptr;
+    dvoid* parameter = nullptr;
+    OCIString* string = nullptr;
+    const auto text = [](const char* chars) { return reinterpret_cast<const OraText*>(chars); };
+    const char* block = "begin open :c for select 'abc' from dual; end;";
+    const sword results[] = {
+        OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr),
+        OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, text(":memory:"), 8),
+        OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&stmt), OCI_HTYPE_STMT, 0, nullptr),
+        OCIStmtPrepare(stmt, err, text(block), static_cast<ub4>(std::strlen(block)), OCI_NTV_SYNTAX, OCI_DEFAULT),
+        OCIBindByPos(stmt, &bind, err, 1, &cursor, 8, SQLT_CUR, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT),
+        OCIStmtExecute(svc, stmt, err, 1, 0, nullptr, nullptr, OCI_DEFAULT),
+        OCIParamGet(cursor, OCI_HTYPE_STMT, err, &parameter, 1),
+        OCIDefineByPos(cursor, &define, err, 1, &string, 8, SQLT_VST, nullptr, nullptr, nullptr, OCI_DEFAULT),
+        OCIStmtFetch(cursor, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT),
+    };
+    OCILogoff(svc, err);
+    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    return std::count(std::begin(results), std::end(results), OCI_SUCCESS) == std::ssize(results);
+}
+
+TEST(Memory, ThatFailsAtEachBlockInTurn) {
+    int blocks = 0;
+    while (!LiveWith(blocks) && blocks < 100) {
+        EXPECT_EQ(OCI_memGetMemCount(), 0) << blocks;
+        ++blocks;
+    }
+    EXPECT_GT(blocks, 5);
+    EXPECT_LT(blocks, 100);
+    EXPECT_EQ(OCI_memGetMemCount(), 0);
+}
+
+class Threads : public StatementTest {
+protected:
+    Threads() : StatementTest(OCI_THREADED) {}
+};
+
+// Each thread with handles of its own, all on one session.
+TEST_F(Threads, StatementsOfOneSession) {
+    MustRun("create table t(a number, b varchar2(10))");
+    constexpr int kThreads = 4, kRows = 50;
+    std::atomic<int> failures = 0;
+    const auto work = [&](int thread) {
+        OCIError* error = New<OCIError>(OCI_HTYPE_ERROR);
+        for (int row = 0; row < kRows; ++row) {
+            OCIStmt* statement = nullptr;
+            OCIBind* bind = nullptr;
+            OCIDefine* define = nullptr;
+            sb4 value = thread * kRows + row, out = 0;
+            const auto* insert = reinterpret_cast<const OraText*>("insert into t values(:1, 'x')");
+            const auto* query = reinterpret_cast<const OraText*>("select a from t where a = :1");
+            failures += OCIStmtPrepare2(svc, &statement, error, insert, 29, nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT) != OCI_SUCCESS;
+            failures += OCIBindByPos(statement, &bind, error, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT);
+            failures += OCIStmtExecute(svc, statement, error, 1, 0, nullptr, nullptr, OCI_DEFAULT) != OCI_SUCCESS;
+            failures += OCIStmtRelease(statement, error, nullptr, 0, OCI_DEFAULT) != OCI_SUCCESS;
+            bind = nullptr;
+            failures += OCIStmtPrepare2(svc, &statement, error, query, 28, nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT) != OCI_SUCCESS;
+            failures += OCIBindByPos(statement, &bind, error, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT);
+            failures += OCIDefineByPos(statement, &define, error, 1, &out, 4, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT);
+            failures += OCIStmtExecute(svc, statement, error, 1, 0, nullptr, nullptr, OCI_DEFAULT) != OCI_SUCCESS;
+            failures += OCIStmtRelease(statement, error, nullptr, 0, OCI_DEFAULT) != OCI_SUCCESS;
+            failures += out != value;
+        }
+    };
+    const ub4 cache = 3;
+    ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, const_cast<ub4*>(&cache), 0, OCI_ATTR_STMTCACHESIZE, err)), 0);
+    std::vector<std::thread> threads;
+    for (int thread = 0; thread < kThreads; ++thread) threads.emplace_back(work, thread);
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(failures, 0);
+    EXPECT_EQ(One("select count(distinct a) from t"), "200");
 }
 
 }  // namespace
