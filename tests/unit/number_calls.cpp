@@ -1,0 +1,144 @@
+// The exported number functions: what they answer to missing handles and pointers, which record they leave, and texts
+// in UTF-16 environments.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+
+#include "oci.h"
+
+namespace {
+
+class NumberCalls : public testing::TestWithParam<ub4> {
+protected:
+    void SetUp() override {
+        ASSERT_EQ(OCIEnvCreate(&environment_, GetParam(), nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+        ASSERT_EQ(OCIHandleAlloc(environment_, reinterpret_cast<dvoid**>(&error_), OCI_HTYPE_ERROR, 0, nullptr),
+                  OCI_SUCCESS);
+    }
+    void TearDown() override { OCIHandleFree(environment_, OCI_HTYPE_ENV); }
+
+    [[nodiscard]] bool Utf16() const { return GetParam() == OCI_UTF16; }
+
+    // A text in the form of the environment.
+    [[nodiscard]] std::string Bytes(const std::string& ascii) const {
+        if (!Utf16()) return ascii;
+        std::string units;
+        for (const char c : ascii) units.append({c, '\0'});
+        return units;
+    }
+
+    OCINumber Number(const std::string& text) {
+        OCINumber value{};
+        const std::string bytes = Bytes(text), model = Bytes(std::string(text.size(), '9'));
+        EXPECT_EQ(FromText(bytes, model, &value), OCI_SUCCESS) << text;
+        return value;
+    }
+    sword FromText(const std::string& bytes, const std::string& model, OCINumber* value) {
+        return OCINumberFromText(error_, reinterpret_cast<const OraText*>(bytes.data()), static_cast<ub4>(bytes.size()),
+                                 reinterpret_cast<const OraText*>(model.data()), static_cast<ub4>(model.size()),
+                                 nullptr, 0, value);
+    }
+
+    // The number of the last record, 0 when there is none.
+    sb4 Recorded() {
+        sb4 code = 0;
+        return OCIErrorGet(error_, 1, nullptr, &code, nullptr, 0, OCI_HTYPE_ERROR) == OCI_NO_DATA ? 0 : code;
+    }
+
+    OCIEnv* environment_ = nullptr;
+    OCIError* error_ = nullptr;
+};
+
+INSTANTIATE_TEST_SUITE_P(Forms, NumberCalls, testing::Values(OCI_DEFAULT, OCI_UTF16));
+
+}  // namespace
+
+TEST_P(NumberCalls, MissingHandlesAndPointers) {
+    OCINumber one = Number("1"), result;
+    char memory[15] = {};
+    EXPECT_EQ(OCINumberAdd(nullptr, &one, &one, &result), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCINumberAdd(reinterpret_cast<OCIError*>(memory), &one, &one, &result), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCINumberSin(nullptr, nullptr, nullptr), OCI_INVALID_HANDLE);
+    const sword codes[] = {OCINumberAdd(error_, nullptr, &one, &result),
+                           OCINumberAdd(error_, &one, &one, nullptr),
+                           OCINumberSqrt(error_, nullptr, &result),
+                           OCINumberInc(error_, nullptr),
+                           OCINumberSign(error_, &one, nullptr),
+                           OCINumberCmp(error_, &one, nullptr, nullptr),
+                           OCINumberFromInt(error_, nullptr, 4, OCI_NUMBER_SIGNED, &result),
+                           OCINumberToReal(error_, &one, 8, nullptr),
+                           OCINumberToReal(error_, &one, 0, memory),
+                           OCINumberToRealArray(error_, nullptr, 3, 8, memory),
+                           OCINumberFromText(error_, nullptr, 5, nullptr, 0, nullptr, 0, &result),
+                           OCINumberToText(error_, &one, nullptr, 0, nullptr, 0, nullptr, nullptr)};
+    for (const sword code : codes) EXPECT_EQ(code, OCI_ERROR);
+    EXPECT_EQ(Recorded(), 21560);
+    OCINumberSetZero(nullptr, &result);
+    OCINumberSetPi(error_, nullptr);
+    EXPECT_EQ(OCINumberAdd(error_, &one, &result, &result), OCI_SUCCESS);
+    EXPECT_EQ(Recorded(), 0);
+}
+
+TEST_P(NumberCalls, TheRecordNamesTheMalformedNumber) {
+    OCINumber one = Number("1"), malformed{}, result;
+    EXPECT_EQ(OCINumberMul(error_, &one, &malformed, &result), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22060);
+    OraText text[400] = {};
+    ASSERT_EQ(OCIErrorGet(error_, 1, nullptr, nullptr, text, sizeof text, OCI_HTYPE_ERROR), OCI_SUCCESS);
+    const std::string wanted = Bytes("number 2");
+    EXPECT_NE(std::string(reinterpret_cast<char*>(text), sizeof text).find(wanted), std::string::npos);
+}
+
+TEST_P(NumberCalls, IntegersOfOtherLengthsAndFlags) {
+    OCINumber one = Number("1"), minus = Number("-1");
+    ub4 integer = 7;
+    EXPECT_EQ(OCINumberToInt(error_, &one, 3, OCI_NUMBER_SIGNED, nullptr), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22057);
+    EXPECT_EQ(OCINumberToInt(error_, &one, 4, 1, &integer), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22055);
+    EXPECT_EQ(OCINumberToInt(error_, &minus, 4, OCI_NUMBER_UNSIGNED, &integer), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22054);
+    EXPECT_EQ(integer, 7u) << "untouched by a failure";
+}
+
+TEST_P(NumberCalls, RealArraysStopAtTheFirstFailure) {
+    OCINumber one = Number("1"), huge = Number("1e100");
+    const OCINumber* numbers[] = {&one, &huge, &one};
+    float reals[] = {0, 0, 0};
+    EXPECT_EQ(OCINumberToRealArray(error_, numbers, 3, sizeof(float), reals), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22053);
+    EXPECT_EQ(reals[0], 1);
+    EXPECT_EQ(reals[2], 0);
+}
+
+TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
+    const OCINumber value = Number("-1234.5");
+    const std::string model = Bytes("L9G999D99"),
+                      settings = Bytes("NLS_NUMERIC_CHARACTERS='',.'' NLS_CURRENCY=''EUR''");
+    const std::string wanted = Bytes("-EUR1.234,50");
+    const auto write = [&](ub4* size, OraText* text) {
+        return OCINumberToText(error_, &value, reinterpret_cast<const OraText*>(model.data()),
+                               static_cast<ub4>(model.size()), reinterpret_cast<const OraText*>(settings.data()),
+                               static_cast<ub4>(settings.size()), size, text);
+    };
+    OraText text[64];
+    ub4 size = sizeof text;
+    ASSERT_EQ(write(&size, text), OCI_SUCCESS);
+    EXPECT_EQ(std::string(reinterpret_cast<char*>(text), size), wanted);
+    size = static_cast<ub4>(wanted.size()) - 1;
+    EXPECT_EQ(write(&size, text), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22059);
+    size = static_cast<ub4>(-1);
+    EXPECT_EQ(write(&size, text), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 21560);
+    OCINumber result;
+    EXPECT_EQ(FromText(Bytes("1x"), Bytes("99"), &result), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22062);
+    EXPECT_EQ(FromText(Bytes("1"), Bytes("Q"), &result), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 22061);
+    if (Utf16()) {
+        EXPECT_EQ(FromText(std::string("\x00\xDC", 2), Bytes("9"), &result), OCI_ERROR);
+        EXPECT_EQ(Recorded(), 24501);
+    }
+}
