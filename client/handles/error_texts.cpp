@@ -199,7 +199,7 @@ constexpr Wording kWordings[] = {
     {1578, "database file is corrupt"},
     {1653, "no room to extend the database"},
     {1722, "invalid number"},
-    {1747, "invalid column specification"},
+    {1747, "invalid way to name a column"},
     {1756, "string not closed"},
     {1789, "column count differs"},
     {1790, "column types differ"},

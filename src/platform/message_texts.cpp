@@ -34,7 +34,7 @@ constexpr Meaning kMeanings[] = {
     {"24", "invalid cursor state"},
     {"25", "invalid transaction state"},
     {"26", "invalid SQL statement name"},
-    {"28", "invalid authorization specification"},
+    {"28", "invalid authorization"},
     {"2D", "invalid transaction termination"},
     {"2E", "invalid connection name"},
     {"34", "invalid cursor name"},
