@@ -172,7 +172,10 @@ private:
         if (element.has_sign) PutSign();
         if (!element.spelled) {
             writer_.PutDigits(static_cast<unsigned>(number), filled_ ? element.width : 1);
-            if (element.ordinal) writer_.PutCased(OrdinalEnding(number), element.letters);
+            const bool upper = element.letters == LetterCase::upper;
+            if (element.ordinal) {
+                writer_.PutCased(OrdinalEnding(number), upper ? LetterCase::upper : LetterCase::lower);
+            }
             return;
         }
         Words words;

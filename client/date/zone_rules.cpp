@@ -60,7 +60,7 @@ private:
         while (length < rest_.size() && (bracketed ? rest_[length] != '>' : IsLetter(rest_[length]))) ++length;
         *name = rest_.substr(0, length);
         rest_.remove_prefix(length);
-        return length > 0 && (!bracketed || Take('>'));
+        return length >= 3 && (!bracketed || Take('>'));
     }
 
     bool Time(int* seconds) {

@@ -1,0 +1,160 @@
+// Time zones: offsets, regions, comparing.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <ctime>
+#include <fstream>
+#include <random>
+#include <sstream>
+
+#include "date/zone.h"
+#include "date/zone_rules.h"
+
+namespace {
+
+using namespace date;
+
+DateTime Read(std::string_view text) {
+    DateTime value;
+    EXPECT_EQ(FromEngineText(text, &value), 0) << text;
+    return value;
+}
+
+TEST(Zone, OffsetsByTheirText) {
+    const struct { const char* zone; int minutes; Errno number; } cases[] = {
+        {"+05:30", 330, 0},        {"-08:00", -480, 0},       {"+5", 300, 0},           {"-00:30", -30, 0},
+        {"+14:00", 840, 0},        {"+15:00", 0, kBadZoneHour}, {"-12:00", -720, 0},    {"-12:01", 0, kBadZoneHour},
+        {"-13:00", 0, kBadZoneHour}, {"+05:60", 0, kBadZoneMinute}, {"+", 0, kBadZone}, {"+a", 0, kBadZone},
+        {"+05:", 0, kBadZone},     {"+05:30x", 0, kBadZone},  {"+123", 0, kBadZone}};
+    for (const auto& c : cases) {
+        DateTime value = Read("2024-01-01");
+        EXPECT_EQ(SetZone(c.zone, &value), c.number) << c.zone;
+        EXPECT_EQ(value.zone_minutes, c.minutes) << c.zone;
+        EXPECT_EQ(value.has_zone, c.number == 0) << c.zone;
+    }
+}
+
+TEST(Zone, RegionsKnowTheirSeasons) {
+    const struct { const char* value; const char* region; int minutes; const char* name; } cases[] = {
+        {"2024-01-15 12:00:00", "Europe/Paris", 60, "CET"},
+        {"2024-07-15 12:00:00", "Europe/Paris", 120, "CEST"},
+        {"2024-03-31 01:59:59", "Europe/Paris", 60, "CET"},
+        {"2024-03-31 02:30:00", "Europe/Paris", 60, "CEST"},     // skipped: the offset before it
+        {"2024-03-31 03:00:00", "Europe/Paris", 120, "CEST"},
+        {"2024-10-27 02:30:00", "Europe/Paris", 120, "CEST"},    // comes twice: the first
+        {"2024-10-27 03:00:00", "Europe/Paris", 60, "CET"},
+        {"2099-07-15 12:00:00", "America/New_York", -240, "EDT"},
+        {"2024-01-15 12:00:00", "Australia/Sydney", 660, "AEDT"},
+        {"2024-01-15 12:00:00", "Asia/Kolkata", 330, "IST"},
+        {"1890-01-15 12:00:00", "Europe/Berlin", 53, "LMT"},
+        {"2024-01-15 12:00:00", "UTC", 0, "UTC"}};
+    for (const auto& c : cases) {
+        DateTime value = Read(c.value);
+        ASSERT_EQ(SetZone(c.region, &value), 0) << c.region;
+        EXPECT_EQ(value.zone_minutes, c.minutes) << c.value << ' ' << c.region;
+        EXPECT_EQ(RegionName(value), c.region);
+        EXPECT_EQ(ZoneAbbreviation(value), c.name) << c.value << ' ' << c.region;
+    }
+}
+
+TEST(Zone, NamesThatAreNoRegions) {
+    for (const char* name : {"Atlantis", "../../etc/passwd", "Europe/../Europe/Paris", "/etc/localtime", "Europe/",
+                             "Europe", "Europe//Paris", "zone.tab", "tzdata.zi", "Europe/Paris ", "Europe.Paris",
+                             "\xC3\xA9", "+Europe", "."}) {
+        DateTime value = Read("2024-01-01");
+        EXPECT_NE(SetZone(name, &value), 0) << name;
+        EXPECT_FALSE(value.has_zone) << name;
+    }
+    DateTime value = Read("2024-01-01");
+    EXPECT_EQ(SetZone(std::string(100000, 'x'), &value), kUnknownRegion);
+}
+
+TEST(Zone, ComparesMoments) {
+    const struct { const char* left; const char* right; int order; } cases[] = {
+        {"2024-01-01 12:00:00 +05:30", "2024-01-01 06:30:00 +00:00", 0},
+        {"2024-01-01 00:30:00 +02:00", "2023-12-31 22:29:59 +00:00", 1},
+        {"2024-01-01 00:00:00 -01:00", "2024-01-01 00:30:00 +00:00", 1},
+        {"2024-01-01 00:00:00.000000001 +01:00", "2023-12-31 23:00:00 +00:00", 1},
+        {"1582-10-15 00:00:00 +02:00", "1582-10-04 22:00:00 +00:00", 0},
+        {"2024-01-01 00:00:00", "2024-01-01 00:00:01", -1}};
+    for (const auto& c : cases) {
+        EXPECT_EQ(CompareMoments(Read(c.left), Read(c.right)), c.order) << c.left << ' ' << c.right;
+        EXPECT_EQ(CompareMoments(Read(c.right), Read(c.left)), -c.order) << c.left << ' ' << c.right;
+    }
+}
+
+TEST(Zone, SeesAMomentElsewhere) {
+    DateTime moved;
+    ASSERT_EQ(ToOffset(Read("2024-01-01 00:30:00 +05:30"), -480, &moved), 0);
+    char text[kMaxEngineText];
+    EXPECT_EQ(std::string(text, ToEngineText(moved, text)), "2023-12-31 11:00:00 -08:00");
+    EXPECT_EQ(ToOffset(Read("9999-12-31 23:30:00 +00:00"), 60, &moved), kBadYear);
+    EXPECT_EQ(ToOffset(Read("-4712-01-01 00:30:00 +01:00"), 0, &moved), kBadYear);
+}
+
+std::string FileBytes(const std::string& path) {
+    std::ifstream file(path, std::ios::binary);
+    std::ostringstream bytes;
+    bytes << file.rdbuf();
+    return bytes.str();
+}
+
+// The C library reads the same files.
+TEST(ZoneRules, AgreeWithTheCLibrary) {
+    std::mt19937_64 random(1582);
+    for (const char* name : {"Europe/Paris", "America/St_Johns", "Australia/Lord_Howe", "Africa/Casablanca",
+                             "Asia/Kathmandu", "America/Asuncion", "Pacific/Apia", "Europe/Dublin", "EST5EDT"}) {
+        const auto rules = ZoneRules::FromFile(FileBytes(std::string("/usr/share/zoneinfo/") + name));
+        ASSERT_TRUE(rules) << name;
+        setenv("TZ", (std::string(":") + name).c_str(), 1);
+        tzset();
+        for (int i = 0; i < 2000; ++i) {
+            const auto moment = static_cast<std::time_t>(random() % 10'000'000'000) - 3'000'000'000;    // 1874 to 2191
+            std::tm local{};
+            localtime_r(&moment, &local);
+            const ZoneState state = rules->At(moment);
+            ASSERT_EQ(state.offset, local.tm_gmtoff) << name << ' ' << moment;
+            ASSERT_EQ(state.abbreviation, local.tm_zone) << name << ' ' << moment;
+        }
+    }
+    unsetenv("TZ");
+    tzset();
+}
+
+TEST(ZoneRules, TextsOfRules) {
+    const struct { const char* text; std::int64_t moment; int offset; const char* name; } cases[] = {
+        {"UTC0", 0, 0, "UTC"},
+        {"<+0330>-3:30", 0, 12600, "+0330"},
+        {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846799, 3600, "CET"},
+        {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"},
+        {"EST5EDT", 1720000000, -14400, "EDT"},
+        {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
+        {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},      // J60 is 1 March in leap years, too
+        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"}};
+    for (const auto& c : cases) {
+        const auto rules = ZoneRules::FromText(c.text);
+        ASSERT_TRUE(rules) << c.text;
+        EXPECT_EQ(rules->At(c.moment).offset, c.offset) << c.text;
+        EXPECT_EQ(rules->At(c.moment).abbreviation, c.name) << c.text;
+    }
+    for (const char* text : {"", "UTC", "5", "CET-1CEST,", "CET-1CEST,M3.5.0", "CET-1CEST,M13.5.0,M10.5.0",
+                             "CET-1CEST,M3.6.0,M10.5.0", "<CET-1", "CET-999", "UTC0x"}) {
+        EXPECT_FALSE(ZoneRules::FromText(text)) << text;
+    }
+}
+
+// Bytes flipped and files cut short: refused or read, without harm.
+TEST(ZoneRules, DamagedFiles) {
+    const std::string good = FileBytes("/usr/share/zoneinfo/Europe/Paris");
+    for (std::size_t length = 0; length < good.size(); length += 7) {
+        EXPECT_FALSE(ZoneRules::FromFile(good.substr(0, length))) << length;
+    }
+    std::mt19937 random(1);
+    for (int i = 0; i < 3000; ++i) {
+        std::string bad = good;
+        for (int n = 0; n < 3; ++n) bad[random() % (i % 2 ? 100 : bad.size())] = static_cast<char>(random());
+        if (const auto rules = ZoneRules::FromFile(bad)) (void)rules->AtWallTime(1'700'000'000);
+    }
+}
+
+}  // namespace
