@@ -8,11 +8,12 @@ namespace {
 constexpr int kNoSuchBind = 1036;
 constexpr int kBadText = 24501;
 
-Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4 length, const Statement::BindArguments& arguments) {
+Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4 length,
+                  const Statement::BindArguments& arguments) {
     if (!name) return Error(kNoSuchBind);
     // A length below 0 asks to measure the name.
-    const TextArgument text(statement.Env(), name, length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length),
-                            false);
+    const std::size_t measured = length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length);
+    const TextArgument text(statement.Env(), name, measured, false);
     return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(kBadText);
 }
 
@@ -27,23 +28,25 @@ sword SetSteps(const void* handle, OCIError* err, ub4 value, ub4 indicator, ub4 
 
 }  // namespace
 
-sword OCIBindByName(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 nameLen, dvoid* value, sb4 valueSize,
-                    ub2 type, dvoid* ind, ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
+sword OCIBindByName(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 nameLen, dvoid* value,
+                    sb4 valueSize, ub2 type, dvoid* ind, ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements,
+                    ub4 mode) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
         return BindByName(statement, bind, name, nameLen,
                           {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
     });
 }
 
-sword OCIBindByPos(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type, dvoid* ind,
-                   ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
+sword OCIBindByPos(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type,
+                   dvoid* ind, ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
-        return statement.BindByPosition(bind, pos, {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
+        return statement.BindByPosition(
+            bind, pos, {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
     });
 }
 
-sword OCIDefineByPos(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type, dvoid* ind,
-                     ub2* rlen, ub2* rcode, ub4 mode) {
+sword OCIDefineByPos(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type,
+                     dvoid* ind, ub2* rlen, ub2* rcode, ub4 mode) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
         return statement.DefineByPosition(def, pos, {value, valueSize, type, ind, rlen, rcode}, mode);
     });

@@ -26,9 +26,11 @@ Status GetRowFailure(ErrorHandle& error, ub4 index, dvoid** out) {
 sword OCIParamGet(const dvoid* hndl, ub4 type, OCIError* err, dvoid** paramOut, ub4 pos) {
     switch (type) {
         case OCI_HTYPE_STMT:
-            return Enter<Statement>(hndl, err, [&](Statement& statement) { return statement.GetParameter(pos, paramOut); });
+            return Enter<Statement>(hndl, err,
+                                    [&](Statement& statement) { return statement.GetParameter(pos, paramOut); });
         case OCI_HTYPE_ERROR:
-            return Enter<ErrorHandle>(hndl, err, [&](ErrorHandle& error) { return GetRowFailure(error, pos, paramOut); });
+            return Enter<ErrorHandle>(hndl, err,
+                                      [&](ErrorHandle& error) { return GetRowFailure(error, pos, paramOut); });
         default:
             return Enter<Object>(hndl, err, [&](Object&) { return Error(kIllegalHandleType); });
     }

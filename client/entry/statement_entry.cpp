@@ -16,7 +16,8 @@ constexpr int kFromPrepare2 = 24433;
 constexpr int kBadText = 24501;
 
 Status CheckSyntax(ub4 language) {
-    return language == OCI_NTV_SYNTAX || language == OCI_V7_SYNTAX || language == OCI_V8_SYNTAX ? Status() : Error(kBadMode);
+    const bool known = language == OCI_NTV_SYNTAX || language == OCI_V7_SYNTAX || language == OCI_V8_SYNTAX;
+    return known ? Status() : Error(kBadMode);
 }
 
 Status Prepare(Statement& statement, const OraText* sql, ub4 length, ub4 language, ub4 mode) {
@@ -29,8 +30,8 @@ Status Prepare(Statement& statement, const OraText* sql, ub4 length, ub4 languag
     return text.View().empty() ? Error(kNoText) : statement.Prepare(text.View());
 }
 
-Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 length, const OraText* key, ub4 key_length,
-                ub4 language, ub4 mode) {
+Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 length, const OraText* key,
+                ub4 key_length, ub4 language, ub4 mode) {
     if (!out) return Error(kNullArgument);
     if (Status status = CheckSyntax(language); !status.Ok()) return status;
     if (mode & ~ub4{OCI_PREP2_CACHE_SEARCHONLY | OCI_UTF16}) return Error(kBadMode);
@@ -38,7 +39,8 @@ Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 
     const TextArgument tag(service.Env(), key, key_length, mode & OCI_UTF16);
     if (!text.Valid() || !tag.Valid()) return Error(kBadText);
     Statement* statement = nullptr;
-    Status status = PrepareThroughCache(service, {text.View(), tag.View(), (mode & OCI_PREP2_CACHE_SEARCHONLY) != 0}, statement);
+    const bool search_only = mode & OCI_PREP2_CACHE_SEARCHONLY;
+    Status status = PrepareThroughCache(service, {text.View(), tag.View(), search_only}, statement);
     if (!status.Failed()) *out = AsHandle<OCIStmt>(statement);
     return status;
 }
@@ -66,23 +68,25 @@ sword SetPiece(dvoid* handle, OCIError* err, const PieceBuffer& piece) {
 }  // namespace
 
 sword OCIStmtPrepare(OCIStmt* stmt, OCIError* err, const OraText* sql, ub4 sqlLen, ub4 language, ub4 mode) {
-    return Enter<Statement>(stmt, err, [&](Statement& statement) { return Prepare(statement, sql, sqlLen, language, mode); });
+    return Enter<Statement>(stmt, err,
+                            [&](Statement& statement) { return Prepare(statement, sql, sqlLen, language, mode); });
 }
 
-sword OCIStmtPrepare2(OCISvcCtx* svc, OCIStmt** stmtOut, OCIError* err, const OraText* sql, ub4 sqlLen, const OraText* key,
-                      ub4 keyLen, ub4 language, ub4 mode) {
+sword OCIStmtPrepare2(OCISvcCtx* svc, OCIStmt** stmtOut, OCIError* err, const OraText* sql, ub4 sqlLen,
+                      const OraText* key, ub4 keyLen, ub4 language, ub4 mode) {
     return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
         return Prepare2(service, stmtOut, sql, sqlLen, key, keyLen, language, mode);
     });
 }
 
 sword OCIStmtRelease(OCIStmt* stmt, OCIError* err, const OraText* key, ub4 keyLen, ub4 mode) {
-    return Enter<Statement>(stmt, err, [&](Statement& statement) { return ReleaseStatement(statement, key, keyLen, mode); });
+    return Enter<Statement>(stmt, err,
+                            [&](Statement& statement) { return ReleaseStatement(statement, key, keyLen, mode); });
 }
 
 // Snapshots are not looked at: a query sees what is there when it is executed.
-sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub4 rowoff, const OCISnapshot*, OCISnapshot*,
-                     ub4 mode) {
+sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub4 rowoff, const OCISnapshot*,
+                     OCISnapshot*, ub4 mode) {
     return EnterWithError<ServiceContext>(svc, err, [&](ServiceContext& service, ErrorHandle& error) {
         auto* statement = Live<Statement>(stmt);
         return statement ? statement->Execute(service, error, {iters, rowoff, mode}) : InvalidHandle();
@@ -109,14 +113,15 @@ sword OCIResultSetToStmt(OCIResult* rset, OCIError* err) {
     });
 }
 
-sword OCIStmtGetBindInfo(OCIStmt* stmt, OCIError* err, ub4 size, ub4 startloc, sb4* found, OraText* names[], ub1 nameLens[],
-                         OraText* indNames[], ub1 indLens[], ub1 dups[], OCIBind* binds[]) {
+sword OCIStmtGetBindInfo(OCIStmt* stmt, OCIError* err, ub4 size, ub4 startloc, sb4* found, OraText* names[],
+                         ub1 nameLens[], OraText* indNames[], ub1 indLens[], ub1 dups[], OCIBind* binds[]) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
         return statement.GetBindInfo({size, startloc, found, names, nameLens, indNames, indLens, dups, binds});
     });
 }
 
-sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type, ub1* inOut, ub4* iter, ub4* idx, ub1* piece) {
+sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type, ub1* inOut, ub4* iter, ub4* idx,
+                          ub1* piece) {
     return Enter<Statement>(stmt, err, [&](const Statement& statement) {
         Statement::PieceInfo info;
         Status status = statement.GetPieceInfo(info);

@@ -1,6 +1,6 @@
-// Statement texts, cache keys and placeholder names as the application gives them: they end at a zero, wherever the length
-// says, so that a length beyond a terminated text does no harm. Seen as UTF-8; converted when the environment or the call
-// says that they are UTF-16.
+// Statement texts, cache keys and placeholder names as the application gives them: they end at a zero, wherever the
+// length says, so that a length beyond a terminated text does no harm. Seen as UTF-8; converted when the environment or
+// the call says that they are UTF-16.
 #pragma once
 
 #include <cstddef>

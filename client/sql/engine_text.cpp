@@ -103,9 +103,11 @@ private:
         const Token& token = tokens_[index];
         if (!open_.empty() && open_.back().as == index && index > 0) return VisitCastType(index);
         if (IsTypePlace(index)) return VisitType(index);
-        if (!open_.empty() && open_.back().is_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
+        const bool in_type_size = !open_.empty() && open_.back().is_type_size;
+        if (in_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
         if (token.Is("dual") && Previous(index).Is("from") && !dialect_.has_dual) {
-            Replace(token, token.End(), FollowedByAlias(index) ? "(select 'X' as dummy)" : "(select 'X' as dummy) as dual");
+            const bool named = FollowedByAlias(index);
+            Replace(token, token.End(), named ? "(select 'X' as dummy)" : "(select 'X' as dummy) as dual");
         } else if (token.Is("for") && step_.locks_rows && !dialect_.has_for_update && open_.empty() &&
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);
@@ -126,8 +128,9 @@ private:
         for (std::size_t index = 1; index < tokens_.size(); ++index) {
             if (tokens_[index].Is("(")) open.push_back(index - 1);
             if (open.empty()) continue;
+            const bool in_cast = tokens_[open.back()].Is("cast");
             if (tokens_[index].Is(")")) open.pop_back();
-            else if (tokens_[index].Is("as") && tokens_[open.back()].Is("cast") && FindCast(index + 1)) cast_as_[open.back()] = index;
+            else if (in_cast && tokens_[index].Is("as") && FindCast(index + 1)) cast_as_[open.back()] = index;
         }
     }
 
@@ -163,7 +166,8 @@ private:
         if (statement_.type == StatementType::alter && open_.empty() && name.Is("type")) return true;
         if (name.kind != TokenKind::word && name.kind != TokenKind::quoted_word) return false;
         if (!open_.empty()) return open_.back().is_columns && (before.Is("(") || before.Is(","));
-        return statement_.type == StatementType::alter && (before.Is("add") || before.Is("column") || before.Is("modify"));
+        const bool adds = before.Is("add") || before.Is("column") || before.Is("modify");
+        return statement_.type == StatementType::alter && adds;
     }
 
     std::size_t VisitType(std::size_t index) {
@@ -183,11 +187,12 @@ private:
 
     // Whether a size in parentheses stands at `index`: "(3)".
     bool IsSize(std::size_t index) const {
-        return At(tokens_, index).Is("(") && At(tokens_, index + 1).kind == TokenKind::number && At(tokens_, index + 2).Is(")");
+        const bool holds_number = At(tokens_, index + 1).kind == TokenKind::number;
+        return holds_number && At(tokens_, index).Is("(") && At(tokens_, index + 2).Is(")");
     }
 
-    // How many tokens the words of `written` are at `index`; 0 when they are not there. A size may stand behind the first
-    // of several words: timestamp(3) with time zone.
+    // How many tokens the words of `written` are at `index`; 0 when they are not there. A size may stand behind the
+    // first of several words: timestamp(3) with time zone.
     std::size_t MatchWords(std::size_t index, std::string_view written) const {
         std::size_t count = 0;
         while (!written.empty()) {
@@ -202,8 +207,9 @@ private:
 
     bool FollowedByAlias(std::size_t index) const {
         constexpr std::string_view kClauses[] = {
-            "where", "group", "order", "having", "union", "intersect", "minus", "except", "connect", "start", "limit", "offset",
-            "fetch", "for", "join", "inner", "left", "right", "full", "cross", "natural", "on", "window", "returning"};
+            "where", "group", "order", "having", "union", "intersect", "minus", "except", "connect", "start", "limit",
+            "offset", "fetch", "for", "join", "inner", "left", "right", "full", "cross", "natural", "on",
+            "window", "returning"};
         const Token& next = At(tokens_, index + 1);
         return next.kind == TokenKind::quoted_word ||
                (next.kind == TokenKind::word &&
@@ -284,7 +290,8 @@ std::uint32_t EngineText::SourceOffset(std::size_t offset) const {
     return static_cast<std::uint32_t>(offset < edit.end ? edit.source_begin : edit.source_end + (offset - edit.end));
 }
 
-EngineText Rewrite(std::string_view text, const StatementText& statement, const Step& step, const engine::Dialect& dialect) {
+EngineText Rewrite(std::string_view text, const StatementText& statement, const Step& step,
+                   const engine::Dialect& dialect) {
     return Rewriter(text, statement, step, dialect).Result();
 }
 

@@ -27,6 +27,7 @@ struct EngineText {
     [[nodiscard]] std::uint32_t SourceOffset(std::size_t offset) const;
 };
 
-EngineText Rewrite(std::string_view text, const StatementText& statement, const Step& step, const engine::Dialect& dialect);
+EngineText Rewrite(std::string_view text, const StatementText& statement, const Step& step,
+                   const engine::Dialect& dialect);
 
 }  // namespace sql

@@ -200,7 +200,8 @@ private:
     }
 
     bool NamesSavepoint(std::size_t first, std::size_t last) const {
-        return std::any_of(tokens_.begin() + static_cast<std::ptrdiff_t>(first), tokens_.begin() + static_cast<std::ptrdiff_t>(last),
+        return std::any_of(tokens_.begin() + static_cast<std::ptrdiff_t>(first),
+                           tokens_.begin() + static_cast<std::ptrdiff_t>(last),
                            [](const Token& token) { return token.Is("to"); });
     }
 
@@ -213,12 +214,14 @@ private:
             if (tokens_[index].Is(")")) --depth;
             if (depth != 0) continue;
             if (tokens_[index].Is("returning")) allowed = true;
-            if (!allowed || !tokens_[index].Is("into") || At(tokens_, index + 1).kind != TokenKind::placeholder) continue;
+            const bool before_target = At(tokens_, index + 1).kind == TokenKind::placeholder;
+            if (!allowed || !before_target || !tokens_[index].Is("into")) continue;
             step.cut_begin = Offset(tokens_[index].begin);
-            for (++index; index < last && (tokens_[index].kind == TokenKind::placeholder || tokens_[index].Is(",")); ++index) {
+            for (++index; index < last; ++index) {
+                const bool is_target = tokens_[index].kind == TokenKind::placeholder;
+                if (!is_target && !tokens_[index].Is(",")) break;
                 step.cut_end = Offset(tokens_[index].End());
-                if (tokens_[index].kind == TokenKind::placeholder && !IsIndicator(tokens_, index))
-                    step.targets.push_back(PlaceholderAt(tokens_[index]));
+                if (is_target && !IsIndicator(tokens_, index)) step.targets.push_back(PlaceholderAt(tokens_[index]));
             }
             return;
         }
@@ -261,7 +264,8 @@ private:
     bool BlockStatement(std::size_t first, std::size_t last) {
         const Token& verb = tokens_[first];
         if (verb.Is("null") && first + 1 == last) return AddTargeted(Run::nothing, first, last, last);
-        if (verb.Is("open") && At(tokens_, first + 1).kind == TokenKind::placeholder && At(tokens_, first + 2).Is("for"))
+        if (verb.Is("open") && At(tokens_, first + 1).kind == TokenKind::placeholder &&
+            At(tokens_, first + 2).Is("for"))
             return AddTargeted(Run::open_cursor, first + 1, first + 3, last);
         if (verb.kind == TokenKind::placeholder && At(tokens_, first + 1).Is(":="))
             return AddTargeted(Run::assign, first, first + 2, last);

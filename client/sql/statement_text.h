@@ -11,8 +11,8 @@ namespace sql {
 
 // What OCI_ATTR_STMT_TYPE answers.
 enum class StatementType : std::uint16_t {
-    unknown = 0, select = 1, update = 2, remove = 3, insert = 4, create = 5, drop = 6, alter = 7, begin = 8, declare = 9,
-    call = 10, merge = 16
+    unknown = 0, select = 1, update = 2, remove = 3, insert = 4, create = 5, drop = 6, alter = 7, begin = 8,
+    declare = 9, call = 10, merge = 16
 };
 
 // How a step is run.

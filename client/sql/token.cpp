@@ -29,7 +29,8 @@ char ClosingOf(char open) {
 }  // namespace
 
 bool EqualsLower(std::string_view text, std::string_view lower) {
-    return std::equal(text.begin(), text.end(), lower.begin(), lower.end(), [](char a, char b) { return Lower(a) == b; });
+    return std::equal(text.begin(), text.end(), lower.begin(), lower.end(),
+                      [](char a, char b) { return Lower(a) == b; });
 }
 
 std::string UpperCase(std::string_view text) {
@@ -50,7 +51,8 @@ Token Tokenizer::Next() {
     if (IsWordStart(c)) {
         const std::size_t end = WordEnd(at_);
         const std::string_view word = text_.substr(at_, end - at_);
-        if (end < text_.size() && text_[end] == '\'' && (EqualsLower(word, "q") || EqualsLower(word, "nq"))) return QLiteral(end);
+        const bool is_q = EqualsLower(word, "q") || EqualsLower(word, "nq");
+        if (is_q && end < text_.size() && text_[end] == '\'') return QLiteral(end);
         return Take(TokenKind::word, end);
     }
     if (IsDigit(c) || (c == '.' && IsDigit(Peek(1)))) return Number();

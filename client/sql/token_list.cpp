@@ -7,7 +7,8 @@ namespace {
 
 bool IsComparison(const Token& token) {
     constexpr std::string_view kSymbols[] = {"=", "<>", "!=", "<", ">", "<=", ">="};
-    return token.kind == TokenKind::symbol && std::find(std::begin(kSymbols), std::end(kSymbols), token.text) != std::end(kSymbols);
+    const bool listed = std::find(std::begin(kSymbols), std::end(kSymbols), token.text) != std::end(kSymbols);
+    return token.kind == TokenKind::symbol && listed;
 }
 
 bool IsOperand(const Token& token) { return token.kind == TokenKind::placeholder || token.kind == TokenKind::literal; }

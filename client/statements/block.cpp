@@ -1,6 +1,6 @@
-// Statements: blocks. Each step runs once for each iteration. A step that takes index-table arguments runs once for each
-// of their elements; one that gives values into such arguments fills their elements from the first on. Targets that are
-// cursors get the rows of a query to fetch.
+// Statements: blocks. Each step runs once for each iteration. A step that takes index-table arguments runs once for
+// each of their elements; one that gives values into such arguments fills their elements from the first on. Targets
+// that are cursors get the rows of a query to fetch.
 #include <algorithm>
 #include <cstring>
 
@@ -72,7 +72,8 @@ bool Statement::IntoTables(const sql::Step& step) const {
 
 // A step once: a query or expression into element `element` of its targets, or a change.
 Status Statement::RunElement(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row, std::size_t element) {
-    if (step.run == sql::Run::query || step.run == sql::Run::assign) return SelectInto(compiled, rows, step, element, row);
+    const bool gives_value = step.run == sql::Run::query || step.run == sql::Run::assign;
+    if (gives_value) return SelectInto(compiled, rows, step, element, row);
     if (Status status = Engine().Begin(); !status.Ok()) return status;
     if (!compiled.query->Columns().empty()) {
         std::uint64_t count = 0;
@@ -104,7 +105,10 @@ Status Statement::SelectIntoTables(Compiled& compiled, Rows& rows, const sql::St
     if (Status status = query.Open(rows, 0); !status.Ok()) return status;
     std::vector<engine::Datum> values(query.Columns().size());
     ub4 most = ~ub4{0};
-    for (const std::uint32_t target : step.targets) most = std::min(most, bound_[target]->IsTable() ? bound_[target]->most_elements : 1);
+    for (const std::uint32_t target : step.targets) {
+        const Bind& bind = *bound_[target];
+        most = std::min(most, bind.IsTable() ? bind.most_elements : 1);
+    }
     ub4 count = 0;
     Status status;
     for (bool found = true; status.Ok();) {

@@ -1,5 +1,5 @@
-// A cursor: the rows of an open query, forward only or scrollable. Rows of a scrollable one are kept as they are reached.
-// Positions count from 1; 0 is before the first row.
+// A cursor: the rows of an open query, forward only or scrollable. Rows of a scrollable one are kept as they are
+// reached. Positions count from 1; 0 is before the first row.
 #pragma once
 
 #include <cstdint>
@@ -27,7 +27,8 @@ public:
 
     // Steps to the next row. `found` is false at the end.
     Status Next(bool& found);
-    // Goes to a row of a scrollable cursor, which `found` says to be there; past the end the position is behind the last.
+    // Goes to a row of a scrollable cursor, which `found` says to be there; past the end the position is behind the
+    // last.
     Status GoTo(std::uint64_t position, bool& found);
     // Reads a scrollable cursor to its end.
     Status Count(std::uint64_t& rows);

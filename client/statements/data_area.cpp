@@ -48,7 +48,8 @@ constexpr AttributeRow kMostCharacters{OCI_ATTR_MAXCHAR_SIZE, Shape::ub4, GetFie
                                        SetField<&DataArea::most_characters>};
 constexpr AttributeRow kPosition{OCI_ATTR_HANDLE_POSITION, Shape::ub4, GetField<&DataArea::position>, nullptr};
 
-constexpr AttributeRow kDefineRows[] = {kCharCount, kScale, kPrecision, kCharSet, kCharForm, kMostCharacters, kPosition};
+constexpr AttributeRow kDefineRows[] = {kCharCount, kScale, kPrecision, kCharSet, kCharForm, kMostCharacters,
+                                        kPosition};
 constexpr AttributeRow kBindRows[] = {
     kCharCount, kScale, kPrecision, kCharSet, kCharForm, kMostBytes, kMostCharacters, kPosition,
     {OCI_ATTR_ROWS_RETURNED, Shape::ub4, GetField<&Bind::rows_returned>, nullptr}};

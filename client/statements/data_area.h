@@ -1,5 +1,5 @@
-// What bind and define handles have in common: where the application keeps the data and in which form, and the buffer that
-// it gave for the next piece of a value.
+// What bind and define handles have in common: where the application keeps the data and in which form, and the buffer
+// that it gave for the next piece of a value.
 #pragma once
 
 #include <cstdint>

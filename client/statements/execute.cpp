@@ -57,7 +57,8 @@ Status Statement::Execute(ServiceContext& service, ErrorHandle& error, const Exe
     last_row_ = 0;
     cancelled_ = false;
     failed_ = true;
-    const bool in_pieces = std::any_of(bound_.begin(), bound_.end(), [](const Bind* bind) { return bind && bind->InPieces(); });
+    const bool in_pieces = std::any_of(bound_.begin(), bound_.end(),
+                                       [](const Bind* bind) { return bind && bind->InPieces(); });
     if (in_pieces) return StartExecuteInPieces(arguments);
     return Run(error, arguments);
 }
@@ -230,7 +231,8 @@ Status Statement::ReturnRow(Compiled& compiled, Rows& rows, const sql::Step& ste
 }
 
 // Puts a row into the binds of a step's targets.
-Status Statement::StoreTargets(const sql::Step& step, engine::Query& query, std::span<const engine::Datum> row, std::size_t index) {
+Status Statement::StoreTargets(const sql::Step& step, engine::Query& query, std::span<const engine::Datum> row,
+                               std::size_t index) {
     const std::size_t count = std::min(step.targets.size(), row.size());
     for (std::size_t target = 0; target < count; ++target) {
         Bind* bind = bound_[step.targets[target]];

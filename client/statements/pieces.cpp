@@ -1,6 +1,6 @@
-// Statements: values in pieces. An execute or fetch that wants a piece answers OCI_NEED_DATA, the application says where
-// the piece is and calls the same function again. Going in, the application decides with ONE or LAST that a value is
-// complete; coming out, a value goes on until it is taken whole or the application says LAST.
+// Statements: values in pieces. An execute or fetch that wants a piece answers OCI_NEED_DATA, the application says
+// where the piece is and calls the same function again. Going in, the application decides with ONE or LAST that a value
+// is complete; coming out, a value goes on until it is taken whole or the application says LAST.
 #include <algorithm>
 #include <cstring>
 #include <utility>
@@ -136,7 +136,8 @@ bool Statement::NextDefineInPieces(std::size_t from, int& error) {
     pieces_.continued = false;
     pieces_.is_null = value.kind == engine::Kind::null;
     pieces_.whole = {};
-    if (!pieces_.is_null) error = active.renderers[static_cast<std::size_t>(value.kind)](value, define.workspace, pieces_.whole);
+    const values::Renderer render = active.renderers[static_cast<std::size_t>(value.kind)];
+    if (!pieces_.is_null) error = render(value, define.workspace, pieces_.whole);
     if (error == 0 && define.Type()->family == values::Family::text)
         error = values::ToApplication(pieces_.whole, define.workspace, pieces_.whole);
     pieces_.rest = pieces_.whole;

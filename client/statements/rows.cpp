@@ -28,7 +28,8 @@ Status Statement::Rows::Collect(const Statement& statement, const Compiled& comp
     for (const std::uint32_t placeholder : compiled.text.placeholders) {
         Bind* bind = statement.bound_[placeholder];
         if (!bind) return Error(kNotAllBound);
-        const auto first = std::find_if(slots_.begin(), slots_.end(), [bind](const Slot& slot) { return slot.bind == bind; });
+        const auto first = std::find_if(slots_.begin(), slots_.end(),
+                                        [bind](const Slot& slot) { return slot.bind == bind; });
         const auto same_as = static_cast<std::size_t>(first - slots_.begin());
         slots_.push_back({bind, same_as, statement.scanned_.placeholders[placeholder].is_row_id});
     }
@@ -38,7 +39,8 @@ Status Statement::Rows::Collect(const Statement& statement, const Compiled& comp
 Status Statement::Rows::Row(std::uint32_t row, std::span<engine::Datum> values) {
     for (std::size_t index = 0; index < slots_.size(); ++index) {
         const Slot& slot = slots_[index];
-        if (slot.same_as != index && slots_[slot.same_as].is_row_id == slot.is_row_id) values[index] = values[slot.same_as];
+        const bool again = slot.same_as != index && slots_[slot.same_as].is_row_id == slot.is_row_id;
+        if (again) values[index] = values[slot.same_as];
         else if (const int error = Load(slot, row, values[index])) return Error(error);
     }
     return {};
@@ -46,9 +48,10 @@ Status Statement::Rows::Row(std::uint32_t row, std::span<engine::Datum> values) 
 
 int Statement::Rows::Load(const Slot& slot, std::uint32_t row, engine::Datum& value) const {
     Bind& bind = *slot.bind;
-    const int error = bind.InPieces() ? LoadCollected(bind, value)
-                                      : values::Load(bind.elements, bind.IsTable() ? table_element : row, bind.Type()->in,
-                                                     bind.workspace, value);
+    const std::uint32_t element = bind.IsTable() ? table_element : row;
+    const int error = bind.InPieces()
+                          ? LoadCollected(bind, value)
+                          : values::Load(bind.elements, element, bind.Type()->in, bind.workspace, value);
     if (error != 0 || !slot.is_row_id || value.kind != engine::Kind::text) return error;
     return values::RowIdFromText(value);
 }

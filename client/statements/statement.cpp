@@ -121,7 +121,8 @@ Status Statement::Prepare(std::string_view text) {
 
 Status Statement::MakeBind(OCIBind** handle, const BindArguments& arguments, Bind*& bind) {
     if (arguments.mode & ~kBindModes) return Error(kBadMode);
-    if (arguments.current_elements && arguments.most_elements > 0 && *arguments.current_elements > arguments.most_elements)
+    if (arguments.current_elements && arguments.most_elements > 0 &&
+        *arguments.current_elements > arguments.most_elements)
         return Error(kBadTableLength);
     bind = Existing<Bind>(handle);
     const bool is_new = !bind;
@@ -227,7 +228,8 @@ void Statement::Forget(const Define& define) noexcept {
 }
 
 void Statement::Forget(const Parameter& parameter) noexcept {
-    std::replace(parameters_.begin(), parameters_.end(), const_cast<Parameter*>(&parameter), static_cast<Parameter*>(nullptr));
+    std::replace(parameters_.begin(), parameters_.end(), const_cast<Parameter*>(&parameter),
+                 static_cast<Parameter*>(nullptr));
 }
 
 // ---- What there is to bind
@@ -251,7 +253,10 @@ Status Statement::GetBindInfo(const BindInfo& info) {
     if (info.first > total) return NoData();
     const std::size_t first = info.first - 1;
     const std::size_t count = std::min<std::size_t>(total - first, info.size);
-    const auto length = [](const std::string& name) { return static_cast<ub1>(std::min<std::size_t>(name.size(), 255)); };
+    const auto length = [](const std::string& name) {
+        constexpr std::size_t kLongest = 255;
+        return static_cast<ub1>(std::min(name.size(), kLongest));
+    };
     const auto text = [](const std::string& name) {
         return reinterpret_cast<OraText*>(const_cast<char*>(name.data()));
     };

@@ -1,5 +1,5 @@
-// Statement handles: text, binds and defines, execution, the open result, pieces in progress. The parts of the class are
-// in files of their own: statement.cpp (text, binds, defines), execute.cpp, block.cpp, fetch.cpp, pieces.cpp,
+// Statement handles: text, binds and defines, execution, the open result, pieces in progress. The parts of the class
+// are in files of their own: statement.cpp (text, binds, defines), execute.cpp, block.cpp, fetch.cpp, pieces.cpp,
 // statement_attributes.cpp.
 #pragma once
 
@@ -176,7 +176,8 @@ private:
     Status RunControl(const ExecuteArguments& arguments);
     Status Finish(ErrorHandle& error, const ExecuteArguments& arguments, engine::ArrayOutcome& outcome);
     Status FetchAtExecute(const ExecuteArguments& arguments);
-    Status StoreTargets(const sql::Step& step, engine::Query& query, std::span<const engine::Datum> row, std::size_t index);
+    Status StoreTargets(const sql::Step& step, engine::Query& query, std::span<const engine::Datum> row,
+                        std::size_t index);
 
     // block.cpp
     Status RunBlock(const ExecuteArguments& arguments);

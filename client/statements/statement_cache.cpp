@@ -56,7 +56,7 @@ Statement* StatementCache::TakeByKey(std::string_view key) {
 }
 
 Statement* StatementCache::TakeByText(std::string_view text) {
-    return Take([text](const Statement* statement) { return statement->cache_key.empty() && statement->Text() == text; });
+    return Take([text](const Statement* kept) { return kept->cache_key.empty() && kept->Text() == text; });
 }
 
 void StatementCache::Keep(Statement& statement, std::string_view key) {

@@ -1,6 +1,6 @@
 // Conversions between the engine's values (Datum) and the external types of the application's elements, both ways. What
-// converts is looked up once, when a bind or define is made; a value then takes one call through a pointer and allocates
-// nothing once the workspace has grown to the longest value.
+// converts is looked up once, when a bind or define is made; a value then takes one call through a pointer and
+// allocates nothing once the workspace has grown to the longest value.
 //
 // Conversions answer 0 or a published error number. Truncation is 1406 with the value stored as far as it fits.
 #pragma once
@@ -124,12 +124,14 @@ int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter
 int ToApplication(std::string_view utf8, Workspace& workspace, std::string_view& text);
 
 // Reads one element.
-inline int Load(const Elements& elements, std::size_t index, InConverter in, Workspace& workspace, engine::Datum& datum) {
+inline int Load(const Elements& elements, std::size_t index, InConverter in, Workspace& workspace,
+                engine::Datum& datum) {
     datum.kind = engine::Kind::null;
     const char* at = elements.Value(index);
     if (!at || elements.IsNull(index)) return 0;
     const bool has_length = elements.lengths != nullptr;
-    return in({at, elements.size, has_length, has_length ? elements.Length(index) : std::uint16_t{0}}, workspace, datum);
+    return in({at, elements.size, has_length, has_length ? elements.Length(index) : std::uint16_t{0}}, workspace,
+              datum);
 }
 
 }  // namespace values

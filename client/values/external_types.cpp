@@ -1,4 +1,5 @@
-// The external types, one row a code, and the laying of a value into an element with its indicator, length and return code.
+// The external types, one row a code, and the laying of a value into an element with its indicator, length and return
+// code.
 #include <limits>
 
 #include "oci.h"

@@ -134,10 +134,12 @@ int PutFlt(double value, Workspace&, Target& target) {
 template <class Form, auto put, auto integer, auto real, auto decimal, auto text>
 constexpr ByOrigin<OutConverter> kRow = {
     NoConversion, Through<Form, integer, put>, Through<Form, real, put>, Through<Form, decimal, put>,
-    Through<Form, text, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, Through<Form, text, put>};
+    Through<Form, text, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion,
+    Through<Form, text, put>};
 
 template <auto put>
-constexpr ByOrigin<OutConverter> kNumberRow = kRow<OCINumber, put, NumberOfInteger, NumberOfReal, OwnNumber, NumberOfText>;
+constexpr ByOrigin<OutConverter> kNumberRow =
+    kRow<OCINumber, put, NumberOfInteger, NumberOfReal, OwnNumber, NumberOfText>;
 
 }  // namespace
 

@@ -89,7 +89,8 @@ int HexText(const Datum& datum, Workspace& workspace, View& text) {
 // "YYYY-MM-DD ..." of the common era as DD-MON-RR, without reading more than that takes. False: another form.
 bool ShortDate(View engine_text, char* text) {
     constexpr char kMonths[] = "JANFEBMARAPRMAYJUNJULAUGSEPOCTNOVDEC";
-    if (engine_text.size() != 19 || engine_text[4] != '-' || engine_text[7] != '-' || engine_text[10] != ' ') return false;
+    if (engine_text.size() != 19) return false;
+    if (engine_text[4] != '-' || engine_text[7] != '-' || engine_text[10] != ' ') return false;
     for (const std::size_t digit : {0u, 1u, 2u, 3u, 5u, 6u, 8u, 9u})
         if (engine_text[digit] < '0' || engine_text[digit] > '9') return false;
     const int month = (engine_text[5] - '0') * 10 + engine_text[6] - '0';
@@ -124,9 +125,9 @@ int DateText(const Datum& datum, Workspace& workspace, View& text) {
     if (date::FromEngineText(datum.Text(), &value) != 0) return OwnText(datum, workspace, text);
     std::size_t length = 0;
     const auto scope = workspace.column == ColumnClass::date ? date::Scope::date : date::Scope::timestamp;
-    if (const int error = date::ToText(value, model, date::kEnglish, scope, begin, workspace.small.size(), &length)) return error;
+    const int error = date::ToText(value, model, date::kEnglish, scope, begin, workspace.small.size(), &length);
     text = {begin, length};
-    return 0;
+    return error;
 }
 
 int RowIdText(const Datum& datum, Workspace& workspace, View& text) {

@@ -118,7 +118,8 @@ TEST(SqlText, Blocks) {
         EXPECT_EQ(Rewritten(c.text), c.rewritten) << c.text;
     }
     EXPECT_EQ(sql::Scan("begin :x := :y * 2; end;").steps[0].targets, std::vector<std::uint32_t>{0});
-    EXPECT_EQ(sql::Scan("begin select a, b into :x, :y from t; end;").steps[0].targets, (std::vector<std::uint32_t>{0, 1}));
+    EXPECT_EQ(sql::Scan("begin select a, b into :x, :y from t; end;").steps[0].targets,
+              (std::vector<std::uint32_t>{0, 1}));
 }
 
 TEST(SqlText, ReturningInto) {
@@ -156,7 +157,8 @@ TEST(SqlText, WhatTheTextTellsToBeWrong) {
 TEST(SqlText, SpellingsOfTheEngine) {
     const struct { const char* text; const char* rewritten; } cases[] = {
         {"select :b, :a, :b from t", "select ?1, ?2, ?3 from t"},
-        {"select sysdate, t.sysdate, sysdate(1), 'sysdate' as sysdate", "select (now()), t.sysdate, sysdate(1), 'sysdate' as sysdate"},
+        {"select sysdate, t.sysdate, sysdate(1), 'sysdate' as sysdate",
+         "select (now()), t.sysdate, sysdate(1), 'sysdate' as sysdate"},
         {"select 1 from dual", "select 1 from (select 'X' as dummy) as dual"},
         {"select d.dummy from DUAL d where 1=1", "select d.dummy from (select 'X' as dummy) d where 1=1"},
         {"create table t(number number(10,2), raw long raw, v varchar2(20 char), x number(*,3))",
@@ -196,7 +198,8 @@ TEST(SqlText, HostileTextsTakeBoundedTime) {
         return text;
     };
     const auto start = std::chrono::steady_clock::now();
-    for (const char* piece : {"(", "cast(", "'", "\"", "/*", "--\n", ":a ", "?", "rowid in (", "with ", ";", "for update ",
+    for (const char* piece : {"(", "cast(", "'", "\"", "/*", "--\n", ":a ", "?", "rowid in (", "with ", ";",
+                              "for update ",
                               "q'", "q'[", "e+", "begin ", "into :x,", "rowid = "}) {
         const std::string text = repeat(piece);
         const sql::StatementText statement = sql::Scan(text);

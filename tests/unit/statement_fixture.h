@@ -84,14 +84,14 @@ protected:
     };
     sb4 Bind(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT, ub4 most = 0, ub4* current = nullptr) {
         OCIBind* bind = nullptr;
-        return Answer(OCIBindByPos(stmt, &bind, err, position, area.value, area.size, area.type, area.indicators, area.lengths,
-                                   area.codes, most, current, mode));
+        return Answer(OCIBindByPos(stmt, &bind, err, position, area.value, area.size, area.type, area.indicators,
+                                   area.lengths, area.codes, most, current, mode));
     }
     sb4 BindName(std::string_view name, const Area& area, ub4 most = 0, ub4* current = nullptr) {
         OCIBind* bind = nullptr;
         const std::string text = Encoded(name);
-        return Answer(OCIBindByName(stmt, &bind, err, Bytes(text), static_cast<sb4>(text.size()), area.value, area.size, area.type,
-                                    area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT));
+        return Answer(OCIBindByName(stmt, &bind, err, Bytes(text), static_cast<sb4>(text.size()), area.value, area.size,
+                                    area.type, area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT));
     }
     sb4 Define(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT) {
         OCIDefine* define = nullptr;

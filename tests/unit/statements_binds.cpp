@@ -1,5 +1,5 @@
-// Binds by name and position, what GetBindInfo tells of them, the statement cache, and calls with pointers and numbers that
-// no application should pass.
+// Binds by name and position, what GetBindInfo tells of them, the statement cache, and calls with pointers and numbers
+// that no application should pass.
 #include <array>
 
 #include "statement_fixture.h"
@@ -45,14 +45,17 @@ TEST_F(Binds, NewTextLetsThemGo) {
     sb4 value = 5;
     OCIBind* bind = nullptr;
     ASSERT_EQ(Prepare("select :a from dual"), 0);
-    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr,
+                                  OCI_DEFAULT)), 0);
     OCIBind* const first = bind;
-    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr,
+                                  OCI_DEFAULT)), 0);
     EXPECT_EQ(bind, first) << "bound again in place";
     ASSERT_EQ(Prepare("select :a from dual"), 0);
     EXPECT_EQ(Execute(0), 1008);
     EXPECT_EQ(OCIHandleFree(bind, OCI_HTYPE_BIND), OCI_INVALID_HANDLE);
-    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr,
+                                  OCI_DEFAULT)), 0);
     EXPECT_EQ(OCIHandleFree(bind, OCI_HTYPE_BIND), OCI_SUCCESS);
     EXPECT_EQ(Execute(0), 1008) << "freed by hand";
 }
@@ -86,9 +89,10 @@ TEST_F(Binds, ArrayOfStructures) {
     ASSERT_EQ(Prepare("insert into t values(:1, :2)"), 0);
     OCIBind* id = nullptr;
     OCIBind* name = nullptr;
-    ASSERT_EQ(Answer(OCIBindByPos(stmt, &id, err, 1, &rows[0].id, 8, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT)), 0);
-    ASSERT_EQ(Answer(OCIBindByPos(stmt, &name, err, 2, rows[0].name, 8, SQLT_CHR, &rows[0].indicator, &rows[0].length, nullptr, 0,
-                                  nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIBindByPos(stmt, &id, err, 1, &rows[0].id, 8, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr,
+                                  OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIBindByPos(stmt, &name, err, 2, rows[0].name, 8, SQLT_CHR, &rows[0].indicator, &rows[0].length,
+                                  nullptr, 0, nullptr, OCI_DEFAULT)), 0);
     ASSERT_EQ(Answer(OCIBindArrayOfStruct(id, err, sizeof(Row), 0, 0, 0)), 0);
     ASSERT_EQ(Answer(OCIBindArrayOfStruct(name, err, sizeof(Row), sizeof(Row), sizeof(Row), 0)), 0);
     ASSERT_EQ(Execute(3), 0);
@@ -104,8 +108,8 @@ TEST_F(Binds, WhatThereIsToBind) {
     std::array<OCIBind*, 8> binds{};
     sb4 found = 0;
     const auto get = [&](ub4 size, ub4 start) {
-        return Answer(OCIStmtGetBindInfo(stmt, err, size, start, &found, names.data(), name_lengths.data(), indicators.data(),
-                                         indicator_lengths.data(), repeated.data(), binds.data()));
+        return Answer(OCIStmtGetBindInfo(stmt, err, size, start, &found, names.data(), name_lengths.data(),
+                                         indicators.data(), indicator_lengths.data(), repeated.data(), binds.data()));
     };
     const auto shown = [&](std::size_t count) {
         std::string all;
@@ -124,7 +128,8 @@ TEST_F(Binds, WhatThereIsToBind) {
     EXPECT_EQ(shown(2), "SECOND/IND! FIRST/+ ");
     EXPECT_EQ(get(8, 6), 1403);
     EXPECT_EQ(get(8, 0), 1036);
-    EXPECT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 100, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr)), 0);
+    EXPECT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 100, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
+                                        nullptr)), 0);
     ASSERT_EQ(Prepare("select 1 from dual"), 0);
     EXPECT_EQ(get(8, 1), 1403);
     EXPECT_EQ(found, 0);
@@ -139,11 +144,12 @@ protected:
             return view.empty() ? nullptr : reinterpret_cast<const OraText*>(view.data());
         };
         statement = nullptr;
-        return Answer(OCIStmtPrepare2(svc, &statement, err, argument(text), static_cast<ub4>(text.size()), argument(key),
-                                      static_cast<ub4>(key.size()), OCI_NTV_SYNTAX, mode));
+        return Answer(OCIStmtPrepare2(svc, &statement, err, argument(text), static_cast<ub4>(text.size()),
+                                      argument(key), static_cast<ub4>(key.size()), OCI_NTV_SYNTAX, mode));
     }
     sb4 Release(std::string_view key = "", ub4 mode = OCI_DEFAULT) {
-        return Answer(OCIStmtRelease(statement, err, reinterpret_cast<const OraText*>(key.data()), static_cast<ub4>(key.size()), mode));
+        return Answer(OCIStmtRelease(statement, err, reinterpret_cast<const OraText*>(key.data()),
+                                     static_cast<ub4>(key.size()), mode));
     }
     void TurnOn(ub4 size) {
         ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, err)), 0);
@@ -157,7 +163,8 @@ TEST_F(Cache, Off) {
     EXPECT_EQ(Prepare2("select 1 from dual", "", OCI_PREP2_CACHE_SEARCHONLY), 24431);
     EXPECT_EQ(Prepare2("select 1 from dual", "", 0x20), 24300);
     ASSERT_EQ(Prepare2("select 1 from dual"), 0);
-    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err, reinterpret_cast<const OraText*>("commit"), 6, OCI_NTV_SYNTAX, OCI_DEFAULT)), 24433);
+    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err, reinterpret_cast<const OraText*>("commit"), 6, OCI_NTV_SYNTAX,
+                                    OCI_DEFAULT)), 24433);
     EXPECT_EQ(Release("", 0x20), 24300);
     EXPECT_EQ(Release(), 0);
     EXPECT_EQ(OCIStmtRelease(statement, err, nullptr, 0, OCI_DEFAULT), OCI_INVALID_HANDLE);
@@ -221,8 +228,8 @@ TEST_F(Cache, KeepsBindsAndLosesTheOldest) {
 
 // ---- Calls as no application should make them
 
-// Null, foreign, freed and unsuitable pointers in each place; numbers at their ends. What matters is that each call comes
-// back with a code.
+// Null, foreign, freed and unsuitable pointers in each place; numbers at their ends. What matters is that each call
+// comes back with a code.
 TEST_F(Binds, HostileArguments) {
     ASSERT_EQ(Prepare("select :a from dual"), 0);
     OCIStmt* const freed = New<OCIStmt>(OCI_HTYPE_STMT);
@@ -251,25 +258,37 @@ TEST_F(Binds, HostileArguments) {
                     note(OCIStmtPrepare(statement, error, text, 18, OCI_NTV_SYNTAX, number));
                 }
                 note(OCIStmtPrepare(statement, error, nullptr, number, OCI_NTV_SYNTAX, OCI_DEFAULT));
-                note(OCIStmtPrepare2(static_cast<OCISvcCtx*>(a), &made, error, nullptr, number, nullptr, number, OCI_NTV_SYNTAX, OCI_DEFAULT));
-                note(OCIStmtPrepare2(static_cast<OCISvcCtx*>(a), nullptr, error, text, 18, nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT));
+                note(OCIStmtPrepare2(static_cast<OCISvcCtx*>(a), &made, error, nullptr, number, nullptr, number,
+                                     OCI_NTV_SYNTAX, OCI_DEFAULT));
+                note(OCIStmtPrepare2(static_cast<OCISvcCtx*>(a), nullptr, error, text, 18, nullptr, 0, OCI_NTV_SYNTAX,
+                                     OCI_DEFAULT));
                 note(OCIStmtRelease(statement, error, nullptr, number, OCI_DEFAULT));
-                note(OCIStmtExecute(static_cast<OCISvcCtx*>(a), static_cast<OCIStmt*>(b), err, number, 0, nullptr, nullptr, number));
-                note(OCIStmtExecute(static_cast<OCISvcCtx*>(b), static_cast<OCIStmt*>(a), err, 0, number, nullptr, nullptr, OCI_DEFAULT));
+                note(OCIStmtExecute(static_cast<OCISvcCtx*>(a), static_cast<OCIStmt*>(b), err, number, 0, nullptr,
+                                    nullptr, number));
+                note(OCIStmtExecute(static_cast<OCISvcCtx*>(b), static_cast<OCIStmt*>(a), err, 0, number, nullptr,
+                                    nullptr, OCI_DEFAULT));
                 note(OCIStmtFetch(statement, error, number, static_cast<ub2>(number), OCI_DEFAULT));
                 note(OCIStmtFetch2(statement, error, 1, OCI_FETCH_NEXT, size, number));
-                note(OCIBindByName(statement, &bind, error, nullptr, size, area, 8, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, 0));
-                note(OCIBindByName(statement, nullptr, error, text, 1, area, 8, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, 0));
-                note(OCIBindByPos(statement, &bind, error, number, area, size, static_cast<ub2>(number), nullptr, nullptr, nullptr, number, nullptr, number));
-                note(OCIBindByPos(statement, nullptr, error, 1, nullptr, 0, SQLT_CHR, nullptr, nullptr, nullptr, 0, nullptr, 0));
-                note(OCIDefineByPos(statement, &define, error, number, nullptr, size, SQLT_CHR, nullptr, nullptr, nullptr, 0));
-                note(OCIDefineByPos(statement, nullptr, error, 1, area, 8, SQLT_INT, nullptr, nullptr, nullptr, number));
+                note(OCIBindByName(statement, &bind, error, nullptr, size, area, 8, SQLT_INT, nullptr, nullptr, nullptr,
+                                   0, nullptr, 0));
+                note(OCIBindByName(statement, nullptr, error, text, 1, area, 8, SQLT_INT, nullptr, nullptr, nullptr, 0,
+                                   nullptr, 0));
+                note(OCIBindByPos(statement, &bind, error, number, area, size, static_cast<ub2>(number), nullptr,
+                                  nullptr, nullptr, number, nullptr, number));
+                note(OCIBindByPos(statement, nullptr, error, 1, nullptr, 0, SQLT_CHR, nullptr, nullptr, nullptr, 0,
+                                  nullptr, 0));
+                note(OCIDefineByPos(statement, &define, error, number, nullptr, size, SQLT_CHR, nullptr, nullptr,
+                                    nullptr, 0));
+                note(OCIDefineByPos(statement, nullptr, error, 1, area, 8, SQLT_INT, nullptr, nullptr, nullptr,
+                                    number));
                 note(OCIBindArrayOfStruct(static_cast<OCIBind*>(a), error, number, number, number, number));
                 note(OCIDefineArrayOfStruct(static_cast<OCIDefine*>(a), error, number, number, number, number));
                 note(OCIResultSetToStmt(static_cast<OCIResult*>(a), error));
-                note(OCIStmtGetBindInfo(statement, error, number, number, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr));
+                note(OCIStmtGetBindInfo(statement, error, number, number, nullptr, nullptr, nullptr, nullptr, nullptr,
+                                        nullptr, nullptr));
                 note(OCIStmtGetPieceInfo(statement, error, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr));
-                note(OCIStmtSetPieceInfo(a, number, error, nullptr, &length, static_cast<ub1>(number), nullptr, nullptr));
+                note(OCIStmtSetPieceInfo(a, number, error, nullptr, &length, static_cast<ub1>(number), nullptr,
+                                         nullptr));
                 note(OCIStmtSetPieceInfo(a, OCI_HTYPE_BIND, error, area, nullptr, 0, nullptr, nullptr));
                 note(OCIParamGet(a, number, error, &out, number));
                 note(OCIParamGet(a, OCI_HTYPE_ERROR, error, nullptr, number));

@@ -1,8 +1,6 @@
 // Executing: modes, counts, array changes and their failures, transactions, blocks.
 #include <algorithm>
-#include <atomic>
 #include <cstdlib>
-#include <thread>
 
 #include "statement_fixture.h"
 
@@ -337,7 +335,9 @@ struct Budget {
 bool LiveWith(int blocks) {
     Budget budget{blocks};
     OCIEnv* env = nullptr;
-    if (OCIEnvCreate(&env, OCI_DEFAULT, &budget, Budget::Allocate, nullptr, Budget::Release, 0, nullptr) != OCI_SUCCESS) return false;
+    const sword created =
+        OCIEnvCreate(&env, OCI_DEFAULT, &budget, Budget::Allocate, nullptr, Budget::Release, 0, nullptr);
+    if (created != OCI_SUCCESS) return false;
     OCIError* err = nullptr;
     OCISvcCtx* svc = nullptr;
     OCIStmt* stmt = nullptr;
@@ -373,47 +373,6 @@ TEST(Memory, ThatFailsAtEachBlockInTurn) {
     EXPECT_GT(blocks, 5);
     EXPECT_LT(blocks, 100);
     EXPECT_EQ(OCI_memGetMemCount(), 0);
-}
-
-class Threads : public StatementTest {
-protected:
-    Threads() : StatementTest(OCI_THREADED) {}
-};
-
-// Each thread with handles of its own, all on one session.
-TEST_F(Threads, StatementsOfOneSession) {
-    MustRun("create table t(a number, b varchar2(10))");
-    constexpr int kThreads = 4, kRows = 50;
-    std::atomic<int> failures = 0;
-    const auto work = [&](int thread) {
-        OCIError* error = New<OCIError>(OCI_HTYPE_ERROR);
-        for (int row = 0; row < kRows; ++row) {
-            OCIStmt* statement = nullptr;
-            OCIBind* bind = nullptr;
-            OCIDefine* define = nullptr;
-            sb4 value = thread * kRows + row, out = 0;
-            const auto* insert = reinterpret_cast<const OraText*>("insert into t values(:1, 'x')");
-            const auto* query = reinterpret_cast<const OraText*>("select a from t where a = :1");
-            failures += OCIStmtPrepare2(svc, &statement, error, insert, 29, nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT) != OCI_SUCCESS;
-            failures += OCIBindByPos(statement, &bind, error, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT);
-            failures += OCIStmtExecute(svc, statement, error, 1, 0, nullptr, nullptr, OCI_DEFAULT) != OCI_SUCCESS;
-            failures += OCIStmtRelease(statement, error, nullptr, 0, OCI_DEFAULT) != OCI_SUCCESS;
-            bind = nullptr;
-            failures += OCIStmtPrepare2(svc, &statement, error, query, 28, nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT) != OCI_SUCCESS;
-            failures += OCIBindByPos(statement, &bind, error, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT);
-            failures += OCIDefineByPos(statement, &define, error, 1, &out, 4, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT);
-            failures += OCIStmtExecute(svc, statement, error, 1, 0, nullptr, nullptr, OCI_DEFAULT) != OCI_SUCCESS;
-            failures += OCIStmtRelease(statement, error, nullptr, 0, OCI_DEFAULT) != OCI_SUCCESS;
-            failures += out != value;
-        }
-    };
-    const ub4 cache = 3;
-    ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, const_cast<ub4*>(&cache), 0, OCI_ATTR_STMTCACHESIZE, err)), 0);
-    std::vector<std::thread> threads;
-    for (int thread = 0; thread < kThreads; ++thread) threads.emplace_back(work, thread);
-    for (std::thread& thread : threads) thread.join();
-    EXPECT_EQ(failures, 0);
-    EXPECT_EQ(One("select count(distinct a) from t"), "200");
 }
 
 }  // namespace

@@ -93,7 +93,9 @@ TEST_F(Fetching, NullsAndTruncation) {
         sb2 indicator = 9;
         ub2 code = 9;
         ASSERT_EQ(Prepare(std::string("select name from t where id = ") + (c.truncated ? "1" : "3")), 0);
-        ASSERT_EQ(Define(1, {text, 4, SQLT_STR, c.indicators ? &indicator : nullptr, nullptr, c.codes ? &code : nullptr}), 0);
+        sb2* const indicators = c.indicators ? &indicator : nullptr;
+        ub2* const codes = c.codes ? &code : nullptr;
+        ASSERT_EQ(Define(1, {text, 4, SQLT_STR, indicators, nullptr, codes}), 0);
         const sword rc = OCIStmtExecute(svc, stmt, err, 1, 0, nullptr, nullptr, OCI_DEFAULT);
         EXPECT_EQ(rc, c.rc) << shown;
         EXPECT_EQ(Answer(rc), c.number) << shown;
@@ -138,7 +140,8 @@ TEST_F(Fetching, ExecuteDeliversRowsFromTheOffset) {
 }
 
 TEST_F(Fetching, ExactFetch) {
-    const struct { ub4 rows; sword rc; sb4 number; } cases[] = {{7, OCI_SUCCESS, 0}, {6, OCI_ERROR, 1422}, {8, OCI_NO_DATA, 1403}};
+    const struct { ub4 rows; sword rc; sb4 number; } cases[] = {
+        {7, OCI_SUCCESS, 0}, {6, OCI_ERROR, 1422}, {8, OCI_NO_DATA, 1403}};
     ASSERT_EQ(Prepare("select id from t order by id"), 0);
     ASSERT_EQ(Define(1, {ids_, 4, SQLT_INT}), 0);
     for (const auto& c : cases) {
@@ -190,7 +193,8 @@ TEST_F(Fetching, ArrayOfStructures) {
     ASSERT_EQ(Prepare("select id, name from t order by id"), 0);
     OCIDefine* id = nullptr;
     OCIDefine* name = nullptr;
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &id, err, 1, &rows[0].id, 8, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &id, err, 1, &rows[0].id, 8, SQLT_INT, nullptr, nullptr, nullptr,
+                                    OCI_DEFAULT)), 0);
     ASSERT_EQ(Answer(OCIDefineByPos(stmt, &name, err, 2, rows[0].name, 8, SQLT_CHR, &rows[0].indicator, &rows[0].length,
                                     &rows[0].code, OCI_DEFAULT)), 0);
     ASSERT_EQ(Answer(OCIDefineArrayOfStruct(id, err, sizeof(Row), 0, 0, 0)), 0);
@@ -210,7 +214,8 @@ TEST_F(Fetching, DefinesMayBeMadeAnewAndFreed) {
     EXPECT_EQ(wide, 2);
     OCIDefine* define = nullptr;
     double real = 0;
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, &real, 8, SQLT_FLT, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, &real, 8, SQLT_FLT, nullptr, nullptr, nullptr, OCI_DEFAULT)),
+              0);
     EXPECT_EQ(OCIHandleFree(define, OCI_HTYPE_DEFINE), OCI_SUCCESS);
     wide = -1;
     ASSERT_EQ(Fetch(1), 0) << "the other column is still defined";
@@ -231,8 +236,8 @@ protected:
     };
     Wanted Get() const {
         Wanted wanted;
-        EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &wanted.direction, &wanted.iteration,
-                                             &wanted.index, &wanted.piece)), 0);
+        EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &wanted.direction,
+                                             &wanted.iteration, &wanted.index, &wanted.piece)), 0);
         return wanted;
     }
     sb4 Set(const Wanted& wanted, void* buffer, ub4* length, ub1 piece, sb2* indicator, ub2* code = nullptr) const {
@@ -246,8 +251,8 @@ TEST_F(Pieces, OneCycleARow) {
     ASSERT_EQ(Execute(0), 0);
     OCIDefine* defines[2] = {};
     for (ub4 column = 0; column < 2; ++column)
-        ASSERT_EQ(Answer(OCIDefineByPos(stmt, &defines[column], err, column + 1, names_, 1, SQLT_STR, nullptr, nullptr, nullptr,
-                                        OCI_DYNAMIC_FETCH)), 0);
+        ASSERT_EQ(Answer(OCIDefineByPos(stmt, &defines[column], err, column + 1, names_, 1, SQLT_STR, nullptr, nullptr,
+                                        nullptr, OCI_DYNAMIC_FETCH)), 0);
     const char* expected[2][2] = {{"2", "row 2"}, {"3", nullptr}};
     for (const auto& row : expected) {
         ASSERT_EQ(OCIStmtFetch(stmt, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT), OCI_NEED_DATA);
@@ -261,7 +266,8 @@ TEST_F(Pieces, OneCycleARow) {
             sb2 indicator = 9;
             ub2 code = 9;
             ASSERT_EQ(Set(wanted, buffer, &length, wanted.piece, &indicator, &code), 0);
-            EXPECT_EQ(OCIStmtFetch(stmt, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT), column == 0 ? OCI_NEED_DATA : OCI_SUCCESS);
+            const sword expected_rc = column == 0 ? OCI_NEED_DATA : OCI_SUCCESS;
+            EXPECT_EQ(OCIStmtFetch(stmt, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT), expected_rc);
             EXPECT_EQ(indicator, row[column] ? 0 : -1);
             EXPECT_EQ(code, row[column] ? 0 : 1405);
             EXPECT_EQ(std::string(buffer, length), row[column] ? row[column] : "");
@@ -361,9 +367,11 @@ TEST_F(Pieces, NothingIsWanted) {
     char buffer[1];
     EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr)), 24370);
     OCIDefine* define = nullptr;
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, ids_, 4, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, ids_, 4, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT)),
+              0);
     EXPECT_EQ(Answer(OCIStmtSetPieceInfo(define, OCI_HTYPE_DEFINE, err, buffer, &length, 0, nullptr, nullptr)), 24370);
-    EXPECT_EQ(OCIStmtSetPieceInfo(define, OCI_HTYPE_BIND, err, buffer, &length, 0, nullptr, nullptr), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIStmtSetPieceInfo(define, OCI_HTYPE_BIND, err, buffer, &length, 0, nullptr, nullptr),
+              OCI_INVALID_HANDLE);
     EXPECT_EQ(OCIStmtSetPieceInfo(define, 99, err, buffer, &length, 0, nullptr, nullptr), OCI_INVALID_HANDLE);
 }
 
@@ -375,7 +383,8 @@ TEST_F(Fetching, DescriptionOfTheSelectList) {
     ASSERT_EQ(Execute(0, OCI_DESCRIBE_ONLY), 0);
     const struct { const char* name; ub2 type, size; sb2 precision; sb1 scale; ub1 nullable; } columns[] = {
         {"N", SQLT_NUM, 22, 10, 2, 1}, {"I", SQLT_NUM, 22, 38, 0, 0}, {"Mixed", SQLT_CHR, 20, 0, 0, 1},
-        {"F", SQLT_AFC, 3, 0, 0, 1}, {"D", SQLT_DAT, 7, 0, 0, 1}, {"R", SQLT_BIN, 16, 0, 0, 1}, {"B", SQLT_CLOB, 4000, 0, 0, 1}};
+        {"F", SQLT_AFC, 3, 0, 0, 1}, {"D", SQLT_DAT, 7, 0, 0, 1}, {"R", SQLT_BIN, 16, 0, 0, 1},
+        {"B", SQLT_CLOB, 4000, 0, 0, 1}};
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_PARAM_COUNT), std::size(columns));
     for (ub4 position = 1; position <= std::size(columns); ++position) {
         const auto& column = columns[position - 1];

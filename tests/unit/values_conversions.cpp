@@ -23,7 +23,8 @@ class Conversions : public StatementTest {
 protected:
     using StatementTest::StatementTest;
 
-    // What a define of `size` bytes holds after fetching an expression: bytes as the type lays them, or "!" and a number.
+    // What a define of `size` bytes holds after fetching an expression: bytes as the type lays them, or "!" and a
+    // number.
     std::string Out(const std::string& expression, ub2 type, sb4 size) {
         std::string area(static_cast<std::size_t>(size), '#');
         ub2 code = 0;
@@ -35,7 +36,8 @@ protected:
         return answer == 0 || answer == 24345 ? area : "!" + std::to_string(answer);
     }
     // What the database sees of an element.
-    std::string In(const std::string& area, ub2 type, const std::string& seen_through = "quote(:1)", ub2* length = nullptr) {
+    std::string In(const std::string& area, ub2 type, const std::string& seen_through = "quote(:1)",
+                   ub2* length = nullptr) {
         std::string copy = area;
         char text[200] = "";
         sb2 indicator = 0;
@@ -45,6 +47,10 @@ protected:
         if (answer == 0) answer = Execute(1);
         if (answer != 0) return "!" + std::to_string(answer);
         return indicator == -1 ? "-" : text;
+    }
+
+    static std::string Shown(const char* expression, ub2 type, sb4 size) {
+        return std::string(expression) + " as " + std::to_string(type) + " in " + std::to_string(size);
     }
 
     ub2 length_ = 0;
@@ -77,7 +83,7 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
         {"12", SQLT_BIN, 4, nullptr, 932, 0},
     };
     for (const auto& c : cases) {
-        const std::string shown = std::string(c.expression) + " as " + std::to_string(c.type) + " in " + std::to_string(c.size);
+        const std::string shown = Shown(c.expression, c.type, c.size);
         const std::string area = Out(c.expression, c.type, c.size);
         if (!c.hex) {
             EXPECT_EQ(area, "!" + std::to_string(c.length)) << shown;
@@ -92,27 +98,35 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
 TEST_F(Conversions, NumbersAsText) {
     const struct { const char* expression; const char* text; } cases[] = {
         {"0", "0"}, {"-12", "-12"}, {"9223372036854775807", "9223372036854775807"}, {"0.5", ".5"}, {"-0.25", "-.25"},
-        {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"}, {"1e39", "1000000000000000000000000000000000000000"},
-        {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"}, {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf"}, {"-9e999", "-Inf"},
+        {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"},
+        {"1e39", "1000000000000000000000000000000000000000"},
+        {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"}, {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf"},
+        {"-9e999", "-Inf"},
         {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"},
     };
-    for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.text) << c.expression;
+    for (const auto& c : cases)
+        EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.text) << c.expression;
 }
 
 TEST_F(Conversions, Integers) {
     const struct { const char* expression; ub2 type; sb4 size; sb8 value; sb4 error; } cases[] = {
-        {"-128", SQLT_INT, 1, -128, 0}, {"-129", SQLT_INT, 1, 0, 1455}, {"32767", SQLT_INT, 2, 32767, 0}, {"32768", SQLT_INT, 2, 0, 1455},
+        {"-128", SQLT_INT, 1, -128, 0}, {"-129", SQLT_INT, 1, 0, 1455}, {"32767", SQLT_INT, 2, 32767, 0},
+        {"32768", SQLT_INT, 2, 0, 1455},
         {"-2147483648", SQLT_INT, 4, -2147483648LL, 0}, {"2147483648", SQLT_INT, 4, 0, 1455},
-        {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0}, {"9.3e18", SQLT_INT, 8, 0, 1455}, {"-9.3e18", SQLT_INT, 8, 0, 1455},
-        {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0}, {"-2.99", SQLT_INT, 4, -2, 0}, {"' 17 '", SQLT_INT, 4, 17, 0},
-        {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722}, {"x'01'", SQLT_INT, 4, 0, 932},
-        {"255", SQLT_UIN, 1, 255, 0}, {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455}, {"-0.5", SQLT_UIN, 4, 0, 0},
+        {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0}, {"9.3e18", SQLT_INT, 8, 0, 1455},
+        {"-9.3e18", SQLT_INT, 8, 0, 1455},
+        {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0}, {"-2.99", SQLT_INT, 4, -2, 0},
+        {"' 17 '", SQLT_INT, 4, 17, 0},
+        {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722},
+        {"x'01'", SQLT_INT, 4, 0, 932},
+        {"255", SQLT_UIN, 1, 255, 0}, {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455},
+        {"-0.5", SQLT_UIN, 4, 0, 0},
         {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
         {"cast('18446744073709551615' as number)", SQLT_UIN, 8, -1, 0},
         {"cast('18446744073709551616' as number)", SQLT_UIN, 8, 0, 1455}, {"date '2024-01-01'", SQLT_INT, 4, 0, 1722},
     };
     for (const auto& c : cases) {
-        const std::string shown = std::string(c.expression) + " as " + std::to_string(c.type) + " in " + std::to_string(c.size);
+        const std::string shown = Shown(c.expression, c.type, c.size);
         const std::string area = Out(c.expression, c.type, c.size);
         if (c.error != 0) {
             EXPECT_EQ(area, "!" + std::to_string(c.error)) << shown;
@@ -150,7 +164,8 @@ TEST_F(Conversions, PackedDecimalWithScale) {
     OCIDefine* define = nullptr;
     char area[4] = "";
     ASSERT_EQ(Prepare("select -123.456 from dual"), 0);
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)),
+              0);
     ub2 precision = 5;
     sb2 scale = 2;
     ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &precision, 0, OCI_ATTR_PDPRC, err)), 0);
@@ -158,7 +173,8 @@ TEST_F(Conversions, PackedDecimalWithScale) {
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(Hex(std::string(area, 4)), "0012346D");
     ASSERT_EQ(Prepare("select 1234.5 from dual"), 0);
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)),
+              0);
     EXPECT_EQ(Execute(1), 1457) << "six digits, and the precision is five";
 }
 
@@ -227,9 +243,11 @@ TEST_F(Conversions, StringsAndRaws) {
 TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
     const auto bytes = [](const char* text, std::size_t size) { return std::string(text, size); };
     const struct { std::string area; ub2 type; int length; const char* seen; } cases[] = {
-        {"abc", SQLT_CHR, -1, "'abc'"}, {"abc", SQLT_CHR, 2, "'ab'"}, {"abc", SQLT_CHR, 0, "NULL"}, {"abc", SQLT_CHR, 4, "!1485"},
+        {"abc", SQLT_CHR, -1, "'abc'"}, {"abc", SQLT_CHR, 2, "'ab'"}, {"abc", SQLT_CHR, 0, "NULL"},
+        {"abc", SQLT_CHR, 4, "!1485"},
         {"abc", SQLT_AFC, -1, "'abc'"}, {"ab ", SQLT_AFC, -1, "'ab '"}, {"", SQLT_CHR, -1, "NULL"},
-        {bytes("abc\0x", 5), SQLT_STR, -1, "'abc'"}, {bytes("abc\0", 4), SQLT_STR, 2, "'ab'"}, {"abc", SQLT_STR, -1, "!1480"},
+        {bytes("abc\0x", 5), SQLT_STR, -1, "'abc'"}, {bytes("abc\0", 4), SQLT_STR, 2, "'ab'"},
+        {"abc", SQLT_STR, -1, "!1480"},
         {"abc", SQLT_STR, 3, "'abc'"}, {bytes("\0", 1), SQLT_STR, -1, "NULL"},
         {bytes("\2\0abc", 5), SQLT_VCS, -1, "'ab'"}, {bytes("\3\0abc", 5), SQLT_AVC, 1, "'abc'"},
         {bytes("\4\0abc", 5), SQLT_VCS, -1, "!1458"}, {bytes("\377\377abc", 5), SQLT_AVC, -1, "!1458"},
@@ -239,7 +257,8 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {Raw<ub1>(200), SQLT_UIN, -1, "200"}, {Raw(1.5f), SQLT_FLT, -1, "1.5"}, {Raw(-0.25), SQLT_FLT, -1, "-0.25"},
         {bytes("\x12\x34\x5D", 3), SQLT_PDN, -1, "-12345"}, {bytes("\x12\x34\x55", 3), SQLT_PDN, -1, "!1413"},
         {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"},
-        {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"}, {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
+        {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"},
+        {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
         {std::string(8, '\0'), SQLT_CLOB, -1, "!932"}, {std::string(8, '\0'), SQLT_CUR, -1, "!932"},
         {std::string(8, '\0'), SQLT_RDD, -1, "!21710"},
     };
@@ -254,10 +273,13 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
 TEST_F(Conversions, SizesThatATypeCannotHave) {
     const struct { ub2 type; sb4 size; sb4 answer; } cases[] = {
         {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, 0, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483},
-        {SQLT_FLT, 2, 1483}, {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0}, {SQLT_DAT, 6, 1483},
+        {SQLT_FLT, 2, 1483}, {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0},
+        {SQLT_DAT, 6, 1483},
         {SQLT_ODT, 7, 1483}, {SQLT_BFLOAT, 7, 1483}, {SQLT_BDOUBLE, 8, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483},
-        {SQLT_CHR, -1, 1459}, {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459}, {SQLT_LVC, 3, 1459},
-        {SQLT_BIN, -5, 1459}, {SQLT_VBI, 1, 1459}, {SQLT_VST, 4, 1483}, {SQLT_VST, 0, 0}, {SQLT_RSET, -1, 0}, {SQLT_TIME, 7, 1483},
+        {SQLT_CHR, -1, 1459}, {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459},
+        {SQLT_LVC, 3, 1459},
+        {SQLT_BIN, -5, 1459}, {SQLT_VBI, 1, 1459}, {SQLT_VST, 4, 1483}, {SQLT_VST, 0, 0}, {SQLT_RSET, -1, 0},
+        {SQLT_TIME, 7, 1483},
         {0, 8, 3115}, {10, 8, 3115}, {SQLT_NTY, 8, 3115}, {9999, 8, 3115},
     };
     char area[200] = "";
@@ -304,8 +326,8 @@ TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
         {"char(128512)", SQLT_CHR, 3, "232323", 0},    // a pair that does not fit is left out whole
     };
     for (const auto& c : cases) {
-        EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << c.expression << " as " << c.type << " in " << c.size;
-        EXPECT_EQ(length_, c.length) << c.expression << " as " << c.type << " in " << c.size;
+        EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << Shown(c.expression, c.type, c.size);
+        EXPECT_EQ(length_, c.length) << Shown(c.expression, c.type, c.size);
     }
     ASSERT_EQ(Prepare("select length(:1), :2 from dual"), 0);
     std::string in = Encoded("abc");
@@ -337,7 +359,8 @@ TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
     OraText* names[1];
     ub1 lengths[1];
     sb4 found = 0;
-    ASSERT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 1, 1, &found, names, lengths, nullptr, nullptr, nullptr, nullptr)), 0);
+    ASSERT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 1, 1, &found, names, lengths, nullptr, nullptr, nullptr, nullptr)),
+              0);
     EXPECT_EQ(std::string(reinterpret_cast<char*>(names[0]), lengths[0]), Encoded("NAME"));
 }
 
