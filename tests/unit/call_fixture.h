@@ -9,6 +9,8 @@
 #include "kelpci.h"
 #include "oci.h"
 
+constexpr ub4 kHuge = 0xFFFFFFFF;    // a length that nobody means
+
 class CallFixture : public testing::Test {
 protected:
     void SetUp() override { Open(OCI_DEFAULT); }
@@ -24,7 +26,7 @@ protected:
         err_ = static_cast<OCIError*>(handle);
     }
     void Close() {
-        if (env_) EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
+        EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
         env_ = nullptr;
     }
     void Reopen(ub4 mode) {

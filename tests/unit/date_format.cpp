@@ -27,7 +27,8 @@ std::string Show(const DateTime& value, std::string_view model, const char* lang
 std::string Parse(std::string_view text, std::string_view model, const char* language = "english",
                   Scope scope = Scope::timestamp) {
     DateTime value;
-    if (const Errno number = FromText(text, model, *FindLanguage(language), scope, &value)) return std::to_string(number);
+    const Errno number = FromText(text, model, *FindLanguage(language), scope, &value);
+    if (number) return std::to_string(number);
     char engine_text[kMaxEngineText];
     return {engine_text, ToEngineText(value, engine_text)};
 }

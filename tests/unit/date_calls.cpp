@@ -1,0 +1,221 @@
+// The calls on dates and datetime descriptors.
+#include <cstring>
+
+#include "call_fixture.h"
+
+namespace {
+
+OCIDate Date(int year, int month, int day, int hour = 0, int minute = 0, int second = 0) {
+    return {static_cast<sb2>(year),
+            static_cast<ub1>(month),
+            static_cast<ub1>(day),
+            {static_cast<ub1>(hour), static_cast<ub1>(minute), static_cast<ub1>(second)}};
+}
+
+class DateCalls : public CallFixture {
+protected:
+    OCIDateTime* NewDateTime(ub4 type) {
+        dvoid* descriptor = nullptr;
+        EXPECT_EQ(OCIDescriptorAlloc(env_, &descriptor, type, 0, nullptr), OCI_SUCCESS) << type;
+        return static_cast<OCIDateTime*>(descriptor);
+    }
+
+    sword Construct(OCIDateTime* target, const char* zone = nullptr, ub4 fraction = 0) {
+        return OCIDateTimeConstructNS(env_, err_, target, 2024, 7, 15, 13, 14, 15, fraction,
+                                      zone ? Text(zone) : nullptr, zone ? std::strlen(zone) : 0);
+    }
+
+    // Year, month, day or the error's number; hour, minute, second, fraction alike.
+    std::string DateOf(OCIDateTime* value) {
+        sb2 year = 0;
+        ub1 month = 0, day = 0;
+        const sword code = OCIDateTimeGetDateNS(env_, err_, value, &year, &month, &day);
+        if (code != OCI_SUCCESS) return std::to_string(Answer(code));
+        return std::to_string(year) + '-' + std::to_string(month) + '-' + std::to_string(day);
+    }
+    std::string TimeOf(OCIDateTime* value) {
+        ub1 hour = 0, minute = 0, second = 0;
+        ub4 fraction = 0;
+        const sword code = OCIDateTimeGetTimeNS(env_, err_, value, &hour, &minute, &second, &fraction);
+        if (code != OCI_SUCCESS) return std::to_string(Answer(code));
+        return std::to_string(hour) + ':' + std::to_string(minute) + ':' + std::to_string(second) + '.' +
+               std::to_string(fraction);
+    }
+};
+
+TEST_F(DateCalls, RefuseNullAndForeignPointers) {
+    const OCIDate day = Date(2024, 2, 29);
+    OCIDate out{};
+    sword order = 0;
+    sb4 days = 0;
+    uword flags = 0;
+    ub4 size = 10;
+    OraText text[10];
+    const sword codes[] = {
+        OCIDateAddDays(err_, nullptr, 1, &out), OCIDateAddDays(err_, &day, 1, nullptr),
+        OCIDateAddMonths(err_, nullptr, 1, &out), OCIDateAssign(err_, nullptr, &out),
+        OCIDateAssign(err_, &day, nullptr), OCIDateCheck(err_, nullptr, &flags), OCIDateCheck(err_, &day, nullptr),
+        OCIDateLastDay(err_, &day, nullptr),
+        OCIDateCompare(err_, nullptr, &day, &order), OCIDateCompare(err_, &day, nullptr, &order),
+        OCIDateCompare(err_, &day, &day, nullptr), OCIDateDaysBetween(err_, &day, nullptr, &days),
+        OCIDateNextDay(err_, &day, nullptr, 3, &out), OCIDateNextDay(err_, &day, Text("SUN"), 3, nullptr),
+        OCIDateSysDate(err_, nullptr), OCIDateToText(err_, nullptr, nullptr, 0, nullptr, 0, &size, text),
+        OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, nullptr, text),
+        OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, &size, nullptr),
+        OCIDateFromText(err_, nullptr, 5, nullptr, 0, nullptr, 0, &out)};
+    for (const sword code : codes) EXPECT_EQ(Answer(code), 21560) << &code - codes;
+    EXPECT_EQ(OCIDateAddDays(nullptr, &day, 1, &out), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIDateAddDays(Bogus<OCIError>(), &day, 1, &out), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIDateAddDays(reinterpret_cast<OCIError*>(env_), &day, 1, &out), OCI_INVALID_HANDLE);
+}
+
+TEST_F(DateCalls, ResultsAreWrittenOnSuccessOnly) {
+    OCIDate day = Date(2024, 2, 29, 1, 2, 3);
+    EXPECT_EQ(Answer(OCIDateAddMonths(err_, &day, 12, &day)), 0);    // the operand as the result
+    EXPECT_EQ(day.OCIDateYYYY, 2025);
+    EXPECT_EQ(day.OCIDateDD, 28);
+    EXPECT_EQ(day.OCIDateTime.OCITimeSS, 3);
+    const OCIDate bad = Date(2023, 2, 29);
+    EXPECT_EQ(Answer(OCIDateLastDay(err_, &bad, &day)), 1839);
+    EXPECT_EQ(Answer(OCIDateAddDays(err_, &day, 2147483647, &day)), 1841);
+    EXPECT_EQ(Answer(OCIDateNextDay(err_, &day, Text("XYZ"), 3, &day)), 1846);
+    EXPECT_EQ(day.OCIDateYYYY, 2025);
+}
+
+TEST_F(DateCalls, TextsAreWrittenToTheByte) {
+    const OCIDate day = Date(2024, 2, 9);
+    char area[12] = "...........";
+    ub4 size = 9;
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, &size, Text(area))), 0);
+    EXPECT_STREQ(area, "09-FEB-24..");
+    EXPECT_EQ(size, 9u);
+    size = 8;
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text("YYYY-MM-DD"), 10, nullptr, 0, &size, Text(area))), 22059);
+    EXPECT_EQ(size, 10u);
+    EXPECT_STREQ(area, "09-FEB-24..");
+    std::string model;
+    while (model.size() <= 248) model += "JSPTH ";
+    std::string long_text(20000, '\0');
+    size = 20000;
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text(model), static_cast<ub1>(model.size()), Text("FRENCH"), 6, &size,
+                                   Text(long_text))), 0);
+    EXPECT_GT(size, 2500u);
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, nullptr, 0, Text("ELVISH"), 6, &size, Text(area))), 12705);
+    // Lengths beyond the closing zero do no harm.
+    OCIDate out{};
+    EXPECT_EQ(Answer(OCIDateFromText(err_, Text("29/02/2024"), kHuge, Text("DD/MM/YYYY"), 255, nullptr, 0, &out)), 0);
+    EXPECT_EQ(out.OCIDateYYYY, 2024);
+}
+
+TEST_F(DateCalls, TextsInUtf16) {
+    Reopen(OCI_UTF16);
+    const OCIDate day = Date(2024, 3, 9);
+    char16_t area[10] = u"?????????";
+    ub4 size = 18;
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text(u"FMDD MONTH"), 20, Text(u"german"), 12, &size, Text(area))), 0);
+    EXPECT_EQ(size, 12u);
+    EXPECT_EQ(std::u16string(area), u"9 MÄRZ???");
+    OCIDate out{};
+    EXPECT_EQ(Answer(OCIDateFromText(err_, Text(u"9 MÄRZ 2024"), 22, Text(u"DD MONTH YYYY"), 26, Text(u"german"), 12,
+                                     &out)), 0);
+    EXPECT_EQ(out.OCIDateMM, 3);
+    EXPECT_EQ(Answer(OCIDateFromText(err_, Text(u"\xD800x"), 4, nullptr, 0, nullptr, 0, &out)), 24501);
+    OCIDateTime* moment = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
+    EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, moment, 2024, 7, 1, 0, 0, 0, 0, Text(u"Europe/Paris"), 24)), 0);
+}
+
+TEST_F(DateCalls, TypesHaveTheirParts) {
+    const struct { ub4 type; const char* date; const char* time; } cases[] = {
+        {OCI_DTYPE_DATE, "2024-7-15", "1878"},
+        {OCI_DTYPE_TIME, "1878", "13:14:15.250000"},
+        {OCI_DTYPE_TIME_TZ, "1878", "13:14:15.250000"},
+        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.250000"},
+        {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.250000"},
+        {OCI_DTYPE_TIMESTAMP_LTZ, "2024-7-15", "13:14:15.250000"},
+        {OCI_DTYPE_INTERVAL_YM, "2024-7-15", "13:14:15.250000"}};    // the general type
+    for (const auto& c : cases) {
+        OCIDateTime* value = NewDateTime(c.type);
+        const bool has_date = std::string_view(c.date) != "1878", has_time = std::string_view(c.time) != "1878";
+        EXPECT_EQ(DateOf(value), has_date ? "1866" : "1878") << c.type << " unset";
+        EXPECT_EQ(Answer(Construct(value, "+02:00", 250000)), 0) << c.type;
+        EXPECT_EQ(DateOf(value), c.date) << c.type;
+        EXPECT_EQ(TimeOf(value), c.time) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, 2000, 2, 30)), has_date ? 1839 : 1878) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, -44, 3, 15)), has_date ? 0 : 1878) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 4)), has_time ? 0 : 1878) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 1000000)), 1880) << c.type;
+        ub4 flags = 1;
+        EXPECT_EQ(Answer(OCIDateTimeCheckNS(env_, err_, value, &flags)), 0) << c.type;
+        EXPECT_EQ(flags, 0u) << c.type;
+        EXPECT_EQ(DateOf(value), has_date ? "-44-3-15" : "1878") << c.type;
+        EXPECT_EQ(TimeOf(value), has_time ? "1:2:3.4" : "1878") << c.type;
+    }
+}
+
+TEST_F(DateCalls, AssignmentKeepsTheTypesParts) {
+    OCIDateTime* stamp = NewDateTime(OCI_DTYPE_TIMESTAMP);
+    OCIDateTime* zoned = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
+    OCIDateTime* day = NewDateTime(OCI_DTYPE_DATE);
+    OCIDateTime* time = NewDateTime(OCI_DTYPE_TIME);
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, stamp, day)), 1866);
+    ASSERT_EQ(Answer(Construct(zoned, "Asia/Kolkata", 5)), 0);
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, stamp)), 0);
+    EXPECT_EQ(TimeOf(stamp), "13:14:15.5");
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, day)), 0);
+    EXPECT_EQ(DateOf(day), "2024-7-15");
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, time)), 0);
+    EXPECT_EQ(TimeOf(time), "13:14:15.5");
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, time, stamp)), 1878);
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, zoned)), 0);
+}
+
+TEST_F(DateCalls, ComparisonCrossesZones) {
+    OCIDateTime* india = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
+    OCIDateTime* other = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
+    OCIDateTime* time = NewDateTime(OCI_DTYPE_TIME);
+    sword order = 9;
+    EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, india, other, &order)), 1866);
+    ASSERT_EQ(Answer(Construct(india, "+05:30")), 0);
+    ASSERT_EQ(Answer(Construct(time)), 0);
+    const struct { const char* zone; sword order; } cases[] = {
+        {"+05:30", 0}, {"Asia/Kolkata", 0}, {"UTC", -1}, {"+05:31", 1}, {"Pacific/Auckland", 1}};
+    for (const auto& c : cases) {
+        ASSERT_EQ(Answer(Construct(other, c.zone)), 0) << c.zone;
+        EXPECT_EQ(Answer(OCIDateTimeCompareNS(env_, err_, india, other, &order)), 0) << c.zone;
+        EXPECT_EQ(order, c.order) << c.zone;
+    }
+    EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, india, time, &order)), 1870);
+}
+
+TEST_F(DateCalls, DatetimesRefuseNullAndForeignPointers) {
+    OCIDateTime* value = NewDateTime(OCI_DTYPE_TIMESTAMP);
+    ASSERT_EQ(Answer(Construct(value)), 0);
+    sb2 year;
+    ub1 part;
+    ub4 wide;
+    sword order;
+    const sword nulls[] = {
+        OCIDateTimeAssign(env_, err_, nullptr, value), OCIDateTimeAssign(env_, err_, value, nullptr),
+        OCIDateTimeCheck(env_, err_, value, nullptr), OCIDateTimeCheck(env_, err_, nullptr, &wide),
+        OCIDateTimeCompare(env_, err_, value, value, nullptr), OCIDateTimeCompare(env_, err_, value, nullptr, &order),
+        OCIDateTimeGetDate(env_, err_, value, nullptr, &part, &part),
+        OCIDateTimeGetDate(env_, err_, nullptr, &year, &part, &part),
+        OCIDateTimeGetTime(env_, err_, value, &part, &part, &part, nullptr), Construct(nullptr),
+        OCI_datetimeSetDate(env_, err_, nullptr, 1, 1, 1), OCI_datetimeSetTime(env_, err_, nullptr, 1, 1, 1, 1)};
+    for (const sword code : nulls) EXPECT_EQ(Answer(code), 21560) << &code - nulls;
+    auto* foreign = Bogus<OCIDateTime>();
+    auto* error = reinterpret_cast<OCIDateTime*>(err_);
+    for (OCIDateTime* wrong : {foreign, error}) {
+        EXPECT_EQ(Construct(wrong), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIDateTimeAssign(env_, err_, wrong, value), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIDateTimeAssign(env_, err_, value, wrong), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIDateTimeGetDate(env_, err_, wrong, &year, &part, &part), OCI_INVALID_HANDLE);
+    }
+    EXPECT_EQ(OCIDateTimeAssign(nullptr, err_, value, value), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIDateTimeAssign(value, err_, value, value), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIDateTimeAssign(env_, nullptr, value, value), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIDescriptorFree(value, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
+    EXPECT_EQ(OCIDateTimeAssign(env_, err_, value, value), OCI_INVALID_HANDLE);
+}
+
+}  // namespace

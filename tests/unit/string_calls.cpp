@@ -1,0 +1,133 @@
+// The calls on strings and raws.
+#include <cstdlib>
+#include <vector>
+
+#include "call_fixture.h"
+
+namespace {
+
+class StringCalls : public CallFixture {
+protected:
+    std::string Contents(OCIString* string) {
+        const auto* text = reinterpret_cast<const char*>(OCIStringPtr(env_, string));
+        return text ? std::string(text, OCIStringSize(env_, string)) : "(null)";
+    }
+    ub4 Room(OCIString* string) {
+        ub4 size = 0;
+        EXPECT_EQ(OCIStringAllocSize(env_, err_, string, &size), OCI_SUCCESS);
+        return size;
+    }
+};
+
+TEST_F(StringCalls, AStringLivesThroughAssignmentsAndSizes) {
+    OCIString* string = nullptr;
+    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("hello"), 5, &string), OCI_SUCCESS);
+    OCIString* const first = string;
+    EXPECT_EQ(Contents(string), "hello");
+    EXPECT_EQ(OCIStringPtr(env_, string)[5], 0);
+    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("a much longer text"), 18, &string), OCI_SUCCESS);
+    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("bye"), 3, &string), OCI_SUCCESS);
+    EXPECT_EQ(string, first) << "assigned in place";
+    EXPECT_EQ(Contents(string), "bye");
+    EXPECT_EQ(Room(string), 18u);
+    ASSERT_EQ(OCIStringResize(env_, err_, 2, &string), OCI_SUCCESS);
+    EXPECT_EQ(Contents(string), "by");
+    EXPECT_EQ(Room(string), 2u);
+    ASSERT_EQ(OCIStringResize(env_, err_, 100, &string), OCI_SUCCESS);
+    EXPECT_EQ(Contents(string), "by");
+    EXPECT_EQ(Room(string), 100u);
+    ASSERT_EQ(OCIStringAssignText(env_, err_, nullptr, 7, &string), OCI_SUCCESS);
+    EXPECT_EQ(Contents(string), "");
+    ASSERT_EQ(OCIStringResize(env_, err_, 0, &string), OCI_SUCCESS);
+    EXPECT_EQ(string, nullptr);
+    EXPECT_EQ(OCIStringPtr(env_, first), nullptr);
+}
+
+TEST_F(StringCalls, OneIsCopiedToAnother) {
+    OCIString *one = nullptr, *other = nullptr;
+    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("zero\0inside"), 11, &one), OCI_SUCCESS);
+    ASSERT_EQ(OCIStringAssign(env_, err_, one, &other), OCI_SUCCESS);
+    EXPECT_NE(one, other);
+    EXPECT_EQ(Contents(other), std::string("zero\0inside", 11));
+    EXPECT_EQ(OCIStringAssign(env_, err_, one, &one), OCI_SUCCESS);
+    EXPECT_EQ(Contents(one), Contents(other));
+    EXPECT_EQ(OCIStringAssign(env_, err_, nullptr, &other), OCI_SUCCESS);
+    EXPECT_EQ(Contents(other), "");
+    OCIRaw* raw = nullptr;
+    const ub1 bytes[] = {0x01, 0xAB, 0x00};
+    ASSERT_EQ(OCIRawAssignBytes(env_, err_, bytes, 3, &raw), OCI_SUCCESS);
+    OCIRaw* copy = nullptr;
+    ASSERT_EQ(OCIRawAssignRaw(env_, err_, raw, &copy), OCI_SUCCESS);
+    EXPECT_EQ(std::vector(OCIRawPtr(env_, copy), OCIRawPtr(env_, copy) + OCIRawSize(env_, copy)),
+              std::vector<ub1>(bytes, bytes + 3));
+    ub4 room = 0;
+    EXPECT_EQ(OCIRawResize(env_, err_, 2, &copy), OCI_SUCCESS);
+    EXPECT_EQ(OCIRawAllocSize(env_, err_, copy, &room), OCI_SUCCESS);
+    EXPECT_EQ(room, 2u);
+}
+
+TEST_F(StringCalls, RefuseWhatIsNoString) {
+    OCIString* string = nullptr;
+    OCIRaw* raw = nullptr;
+    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("x"), 1, &string), OCI_SUCCESS);
+    ASSERT_EQ(OCIRawAssignBytes(env_, err_, Text("x"), 1, &raw), OCI_SUCCESS);
+    ub4 size = 0;
+    auto* other_kind = reinterpret_cast<OCIString*>(raw);
+    for (OCIString* wrong : {Bogus<OCIString>(), other_kind, reinterpret_cast<OCIString*>(env_)}) {
+        OCIString* target = wrong;
+        EXPECT_EQ(OCIStringAssignText(env_, err_, Text("y"), 1, &target), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIStringAssign(env_, err_, string, &target), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIStringAssign(env_, err_, wrong, &string), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIStringResize(env_, err_, 5, &target), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIStringResize(env_, err_, 0, &target), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIStringAllocSize(env_, err_, wrong, &size), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIStringPtr(env_, wrong), nullptr);
+        EXPECT_EQ(OCIStringSize(env_, wrong), 0u);
+        EXPECT_EQ(target, wrong);
+    }
+    EXPECT_EQ(Answer(OCIStringAssignText(env_, err_, Text("y"), 1, nullptr)), 21560);
+    EXPECT_EQ(Answer(OCIStringResize(env_, err_, 0, nullptr)), 21560);
+    EXPECT_EQ(Answer(OCIStringAllocSize(env_, err_, nullptr, &size)), 21560);
+    EXPECT_EQ(Answer(OCIStringAllocSize(env_, err_, string, nullptr)), 21560);
+    EXPECT_EQ(OCIStringAssignText(nullptr, err_, Text("y"), 1, &string), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIStringAssignText(env_, nullptr, Text("y"), 1, &string), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCIStringPtr(nullptr, string), nullptr);
+    EXPECT_EQ(OCIRawSize(nullptr, raw), 0u);
+}
+
+// A length that cannot be meant is refused before anything is read.
+TEST_F(StringCalls, HugeLengths) {
+    OCIString* string = nullptr;
+    for (const ub4 length : {0xFFFFFFFFu, 0x80000000u, 0x10000001u}) {
+        EXPECT_EQ(Answer(OCIStringAssignText(env_, err_, Text("x"), length, &string)), 22140) << length;
+        EXPECT_EQ(Answer(OCIStringResize(env_, err_, length, &string)), 22140) << length;
+        EXPECT_EQ(string, nullptr);
+    }
+}
+
+// Memory that runs out at the first, the second, the third call.
+TEST(StringMemory, AllocationsThatFail) {
+    static int left;
+    const auto allocate = [](dvoid*, size_t size) -> dvoid* { return left-- > 0 ? std::malloc(size) : nullptr; };
+    const auto reallocate = [](dvoid*, dvoid* memory, size_t size) -> dvoid* { return std::realloc(memory, size); };
+    const auto release = [](dvoid*, dvoid* memory) { std::free(memory); };
+    left = 100;
+    OCIEnv* env = nullptr;
+    ASSERT_EQ(OCIEnvCreate(&env, OCI_DEFAULT, nullptr, allocate, reallocate, release, 0, nullptr), OCI_SUCCESS);
+    dvoid* err = nullptr;
+    ASSERT_EQ(OCIHandleAlloc(env, &err, OCI_HTYPE_ERROR, 0, nullptr), OCI_SUCCESS);
+    int failures = 0;
+    for (int allowed = 0; allowed < 4; ++allowed) {
+        OCIString* string = nullptr;
+        left = allowed;
+        const sword code = OCIStringAssignText(env, static_cast<OCIError*>(err),
+                                               reinterpret_cast<const OraText*>("text"), 4, &string);
+        EXPECT_EQ(string != nullptr, code == OCI_SUCCESS) << allowed;
+        failures += code == OCI_ERROR;
+    }
+    EXPECT_EQ(failures, 2);    // the object, its block
+    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    EXPECT_EQ(OCI_memGetMemCount(), 0);
+}
+
+}  // namespace

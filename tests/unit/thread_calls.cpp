@@ -1,0 +1,275 @@
+// The thread package: its objects, their misuse, and many threads at once.
+#include <atomic>
+#include <thread>
+#include <vector>
+
+#include "call_fixture.h"
+
+namespace {
+
+std::atomic<int> destroyed{0};
+void CountDestroyed(dvoid*) { ++destroyed; }
+
+class ThreadCalls : public CallFixture {
+protected:
+    void SetUp() override {
+        CallFixture::SetUp();
+        OCIThreadProcessInit();
+        EXPECT_EQ(OCIThreadIsMulti(), TRUE);
+        ASSERT_EQ(OCIThreadInit(env_, err_), OCI_SUCCESS);
+        destroyed = 0;
+    }
+    void TearDown() override {
+        EXPECT_EQ(OCIThreadTerm(env_, err_), OCI_SUCCESS);
+        CallFixture::TearDown();
+    }
+
+    OCIThreadMutex* NewMutex() {
+        OCIThreadMutex* mutex = nullptr;
+        EXPECT_EQ(OCIThreadMutexInit(env_, err_, &mutex), OCI_SUCCESS);
+        return mutex;
+    }
+    OCIThreadKey* NewKey(OCIThreadKeyDestFunc destroy = nullptr) {
+        OCIThreadKey* key = nullptr;
+        EXPECT_EQ(OCIThreadKeyInit(env_, err_, &key, destroy), OCI_SUCCESS);
+        return key;
+    }
+    OCIThreadId* NewId() {
+        OCIThreadId* id = nullptr;
+        EXPECT_EQ(OCIThreadIdInit(env_, err_, &id), OCI_SUCCESS);
+        return id;
+    }
+    OCIThreadHandle* NewHandle() {
+        OCIThreadHandle* handle = nullptr;
+        EXPECT_EQ(OCIThreadHndInit(env_, err_, &handle), OCI_SUCCESS);
+        return handle;
+    }
+    boolean Same(OCIThreadId* left, OCIThreadId* right) {
+        boolean same = 9;
+        EXPECT_EQ(OCIThreadIdSame(env_, err_, left, right, &same), OCI_SUCCESS);
+        return same;
+    }
+    boolean IsNull(OCIThreadId* id) {
+        boolean null = 9;
+        EXPECT_EQ(OCIThreadIdNull(env_, err_, id, &null), OCI_SUCCESS);
+        return null;
+    }
+};
+
+// What a thread of the tests works with, and what went wrong in it.
+struct Work {
+    OCIEnv* env;
+    OCIError* err;
+    OCIThreadKey* key = nullptr;
+    OCIThreadMutex* mutex = nullptr;
+    OCIThreadId* id = nullptr;
+    OCIThreadHandle* handle = nullptr;
+    long counter = 0;
+    std::atomic<int> failures{0};
+};
+
+TEST_F(ThreadCalls, MutexesAreNotRecursive) {
+    OCIThreadMutex* mutex = NewMutex();
+    EXPECT_EQ(Answer(OCIThreadMutexRelease(env_, err_, mutex)), 21560);
+    EXPECT_EQ(Answer(OCIThreadMutexAcquire(env_, err_, mutex)), 0);
+    EXPECT_EQ(Answer(OCIThreadMutexAcquire(env_, err_, mutex)), 21560);
+    EXPECT_EQ(Answer(OCIThreadMutexDestroy(env_, err_, &mutex)), 21560);
+    std::thread([&] {
+        dvoid* err = nullptr;
+        OCIHandleAlloc(env_, &err, OCI_HTYPE_ERROR, 0, nullptr);
+        EXPECT_EQ(OCIThreadMutexRelease(env_, static_cast<OCIError*>(err), mutex), OCI_ERROR) << "held by another";
+    }).join();
+    EXPECT_EQ(Answer(OCIThreadMutexRelease(env_, err_, mutex)), 0);
+    OCIThreadMutex* const gone = mutex;
+    EXPECT_EQ(Answer(OCIThreadMutexDestroy(env_, err_, &mutex)), 0);
+    EXPECT_EQ(mutex, nullptr);
+    EXPECT_EQ(OCIThreadMutexAcquire(env_, err_, gone), OCI_INVALID_HANDLE);
+    EXPECT_EQ(Answer(OCIThreadMutexDestroy(env_, err_, &mutex)), 21560);
+}
+
+TEST_F(ThreadCalls, IdentifiersTellThreadsApart) {
+    OCIThreadId *mine = NewId(), *again = NewId(), *other = NewId();
+    EXPECT_TRUE(IsNull(mine));
+    EXPECT_TRUE(Same(mine, again));
+    ASSERT_EQ(OCIThreadIdGet(env_, err_, mine), OCI_SUCCESS);
+    ASSERT_EQ(OCIThreadIdGet(env_, err_, again), OCI_SUCCESS);
+    EXPECT_FALSE(IsNull(mine));
+    EXPECT_TRUE(Same(mine, again));
+    Work work{env_, err_};
+    work.id = NewId();
+    OCIThreadHandle* handle = NewHandle();
+    const auto routine = [](dvoid* given) {
+        auto* mine_alone = static_cast<Work*>(given);
+        mine_alone->failures += OCIThreadIdGet(mine_alone->env, mine_alone->err, mine_alone->id) != OCI_SUCCESS;
+    };
+    ASSERT_EQ(Answer(OCIThreadCreate(env_, err_, routine, &work, other, handle)), 0);
+    EXPECT_FALSE(IsNull(other));
+    ASSERT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 0);
+    EXPECT_EQ(work.failures, 0);
+    EXPECT_TRUE(Same(work.id, other)) << "what the creator was told is what the thread sees";
+    EXPECT_FALSE(Same(mine, other));
+    ASSERT_EQ(OCIThreadIdSet(env_, err_, again, other), OCI_SUCCESS);
+    EXPECT_TRUE(Same(again, other));
+    ASSERT_EQ(OCIThreadIdSetNull(env_, err_, again), OCI_SUCCESS);
+    EXPECT_TRUE(IsNull(again));
+}
+
+TEST_F(ThreadCalls, HandlesAreJoinedOnceAndClosedOnce) {
+    OCIThreadHandle* handle = NewHandle();
+    EXPECT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 21560) << "no thread yet";
+    EXPECT_EQ(Answer(OCIThreadClose(env_, err_, handle)), 21560);
+    EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, nullptr, nullptr, nullptr, handle)), 21560) << "no routine";
+    ASSERT_EQ(Answer(OCIThreadCreate(env_, err_, [](dvoid*) {}, nullptr, nullptr, handle)), 0);
+    EXPECT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 0);
+    EXPECT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 21560);
+    EXPECT_EQ(Answer(OCIThreadClose(env_, err_, handle)), 0);
+    EXPECT_EQ(Answer(OCIThreadClose(env_, err_, handle)), 21560);
+    ASSERT_EQ(Answer(OCIThreadHandleGet(env_, err_, handle)), 0);
+    EXPECT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 21560) << "oneself";
+    EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, nullptr)), 0);
+    while (destroyed == 0) std::this_thread::yield();
+}
+
+TEST_F(ThreadCalls, KeysHoldAValueForEachThread) {
+    OCIThreadKey* key = NewKey(CountDestroyed);
+    OCIThreadKey* plain = NewKey();
+    dvoid* value = &key;
+    EXPECT_EQ(Answer(OCIThreadKeyGet(env_, err_, key, &value)), 0);
+    EXPECT_EQ(value, nullptr);
+    ASSERT_EQ(Answer(OCIThreadKeySet(env_, err_, key, this)), 0);
+    Work work{env_, err_, key};
+    const auto routine = [](dvoid* given) {
+        auto* mine = static_cast<Work*>(given);
+        dvoid* seen = mine;
+        mine->failures += OCIThreadKeyGet(mine->env, mine->err, mine->key, &seen) != OCI_SUCCESS || seen != nullptr;
+        mine->failures += OCIThreadKeySet(mine->env, mine->err, mine->key, mine) != OCI_SUCCESS;
+        mine->failures += OCIThreadKeyGet(mine->env, mine->err, mine->key, &seen) != OCI_SUCCESS || seen != mine;
+    };
+    OCIThreadHandle* handle = NewHandle();
+    ASSERT_EQ(Answer(OCIThreadCreate(env_, err_, routine, &work, nullptr, handle)), 0);
+    ASSERT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 0);
+    EXPECT_EQ(work.failures, 0);
+    EXPECT_EQ(destroyed, 1) << "before the join is done";
+    EXPECT_EQ(Answer(OCIThreadKeyGet(env_, err_, key, &value)), 0);
+    EXPECT_EQ(value, this);
+    // Threads of the application's own get the same; no value, no call; none after the key is gone.
+    std::thread([&] { routine(&work); }).join();
+    EXPECT_EQ(destroyed, 2);
+    work.key = plain;
+    std::thread([&] { routine(&work); }).join();
+    EXPECT_EQ(destroyed, 2);
+    work.key = key;
+    std::thread([&] {
+        routine(&work);
+        OCIThreadKeySet(env_, err_, key, nullptr);
+    }).join();
+    EXPECT_EQ(destroyed, 2);
+    std::thread([&] {
+        routine(&work);
+        EXPECT_EQ(OCIThreadKeyDestroy(env_, err_, &key), OCI_SUCCESS);
+    }).join();
+    EXPECT_EQ(destroyed, 2);
+    EXPECT_EQ(key, nullptr);
+}
+
+// A key's function that uses the package while its thread ends: it is still that thread.
+TEST_F(ThreadCalls, KeyFunctionsMayUseThePackage) {
+    static Work* the_work;
+    Work work{env_, err_};
+    the_work = &work;
+    work.id = NewId();
+    work.key = NewKey([](dvoid*) {
+        the_work->failures += OCIThreadIdGet(the_work->env, the_work->err, the_work->id) != OCI_SUCCESS;
+        if (++the_work->counter < 3) OCIThreadKeySet(the_work->env, the_work->err, the_work->key, the_work);
+    });
+    OCIThreadId* id = NewId();
+    OCIThreadHandle* handle = NewHandle();
+    const auto routine = [](dvoid*) { OCIThreadKeySet(the_work->env, the_work->err, the_work->key, the_work); };
+    ASSERT_EQ(Answer(OCIThreadCreate(env_, err_, routine, nullptr, id, handle)), 0);
+    ASSERT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 0);
+    EXPECT_EQ(work.failures, 0);
+    EXPECT_EQ(work.counter, 3);
+    EXPECT_TRUE(Same(id, work.id));
+}
+
+// Sixty-four threads with one environment and one error handle, some of whose calls fail.
+TEST_F(ThreadCalls, ManyThreadsAtOnce) {
+    constexpr int kThreads = 64, kRounds = 50;
+    Work work{env_, err_};
+    work.key = NewKey(CountDestroyed);
+    work.mutex = NewMutex();
+    const auto routine = [](dvoid* given) {
+        auto& shared = *static_cast<Work*>(given);
+        OCIThreadId* id = nullptr;
+        shared.failures += OCIThreadIdInit(shared.env, shared.err, &id) != OCI_SUCCESS;
+        shared.failures += OCIThreadKeySet(shared.env, shared.err, shared.key, id) != OCI_SUCCESS;
+        for (int i = 0; i < kRounds; ++i) {
+            shared.failures += OCIThreadMutexAcquire(shared.env, shared.err, shared.mutex) != OCI_SUCCESS;
+            ++shared.counter;
+            shared.failures += OCIThreadMutexAcquire(shared.env, shared.err, shared.mutex) != OCI_ERROR;
+            shared.failures += OCIThreadMutexRelease(shared.env, shared.err, shared.mutex) != OCI_SUCCESS;
+            sb4 number = 0;
+            OCIErrorGet(shared.err, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
+        }
+        dvoid* value = nullptr;
+        shared.failures += OCIThreadKeyGet(shared.env, shared.err, shared.key, &value) != OCI_SUCCESS || value != id;
+        shared.failures += OCIThreadIdDestroy(shared.env, shared.err, &id) != OCI_SUCCESS;
+    };
+    std::vector<OCIThreadHandle*> handles;
+    for (int i = 0; i < kThreads; ++i) {
+        handles.push_back(NewHandle());
+        ASSERT_EQ(OCIThreadCreate(env_, err_, routine, &work, NewId(), handles.back()), OCI_SUCCESS);
+    }
+    for (OCIThreadHandle* handle : handles) {
+        EXPECT_EQ(OCIThreadJoin(env_, err_, handle), OCI_SUCCESS);
+        EXPECT_EQ(OCIThreadClose(env_, err_, handle), OCI_SUCCESS);
+        EXPECT_EQ(OCIThreadHndDestroy(env_, err_, &handle), OCI_SUCCESS);
+    }
+    EXPECT_EQ(work.failures, 0);
+    EXPECT_EQ(work.counter, kThreads * kRounds);
+    EXPECT_EQ(destroyed, kThreads);
+}
+
+TEST_F(ThreadCalls, BadArguments) {
+    OCIThreadMutex* mutex = NewMutex();
+    OCIThreadKey* key = NewKey();
+    OCIThreadId* id = NewId();
+    OCIThreadHandle* handle = NewHandle();
+    OCIThreadMutex* const before = mutex;
+    EXPECT_EQ(Answer(OCIThreadMutexInit(env_, err_, &mutex)), 21560) << "it lives already";
+    EXPECT_EQ(mutex, before);
+    boolean flag = 0;
+    const sword nulls[] = {
+        OCIThreadMutexInit(env_, err_, nullptr), OCIThreadMutexDestroy(env_, err_, nullptr),
+        OCIThreadMutexAcquire(env_, err_, nullptr), OCIThreadKeyInit(env_, err_, nullptr, nullptr),
+        OCIThreadKeyGet(env_, err_, key, nullptr), OCIThreadKeySet(env_, err_, nullptr, nullptr),
+        OCIThreadIdInit(env_, err_, nullptr), OCIThreadIdSet(env_, err_, id, nullptr),
+        OCIThreadIdSame(env_, err_, nullptr, id, &flag), OCIThreadIdSame(env_, err_, id, id, nullptr),
+        OCIThreadIdNull(env_, err_, id, nullptr), OCIThreadIdGet(env_, err_, nullptr),
+        OCIThreadHndInit(env_, err_, nullptr), OCIThreadJoin(env_, err_, nullptr),
+        OCIThreadClose(env_, err_, nullptr), OCIThreadHandleGet(env_, err_, nullptr)};
+    for (const sword code : nulls) EXPECT_EQ(code, OCI_ERROR) << &code - nulls;
+    EXPECT_EQ(Answer(OCIThreadHandleGet(env_, err_, nullptr)), 21560);
+    const sword foreign[] = {
+        OCIThreadMutexAcquire(env_, err_, Bogus<OCIThreadMutex>()),
+        OCIThreadKeySet(env_, err_, Bogus<OCIThreadKey>(), nullptr),
+        OCIThreadIdSet(env_, err_, id, Bogus<OCIThreadId>()), OCIThreadJoin(env_, err_, Bogus<OCIThreadHandle>()),
+        OCIThreadMutexAcquire(env_, err_, reinterpret_cast<OCIThreadMutex*>(key)),
+        OCIThreadCreate(env_, err_, CountDestroyed, nullptr, Bogus<OCIThreadId>(), nullptr),
+        OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, Bogus<OCIThreadHandle>()),
+        OCIThreadInit(nullptr, err_), OCIThreadJoin(env_, nullptr, handle), OCIThreadTerm(id, err_)};
+    for (const sword code : foreign) EXPECT_EQ(code, OCI_INVALID_HANDLE) << &code - foreign;
+    EXPECT_EQ(destroyed, 0);
+}
+
+TEST_F(ThreadCalls, NothingWorksOutsideOfThePackage) {
+    ASSERT_EQ(OCIThreadTerm(env_, err_), OCI_SUCCESS);
+    OCIThreadMutex* mutex = nullptr;
+    EXPECT_EQ(Answer(OCIThreadMutexInit(env_, err_, &mutex)), 21560);
+    EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, nullptr)), 21560);
+    EXPECT_EQ(Answer(OCIThreadTerm(env_, err_)), 21560);
+    EXPECT_EQ(mutex, nullptr);
+    ASSERT_EQ(OCIThreadInit(env_, err_), OCI_SUCCESS);
+}
+
+}  // namespace
