@@ -21,8 +21,35 @@ constexpr int kBadResultSet = 24336;
 
 }  // namespace
 
+// A block that fails undoes what it did, unless it has ended a transaction on its way.
 Status Statement::RunBlock(const ExecuteArguments& arguments) {
     if (arguments.iterations <= arguments.first) return Error(kNoIterations);
+    const auto has = [this](auto... runs) {
+        return std::any_of(scanned_.steps.begin(), scanned_.steps.end(),
+                           [=](const sql::Step& step) { return ((step.run == runs) || ...); });
+    };
+    if (!has(sql::Run::change) || has(sql::Run::commit, sql::Run::rollback)) return RunSteps(arguments);
+    if (Status status = Engine().Begin(); !status.Ok()) return status;
+    if (Status status = RunText("savepoint kelp_block"); !status.Ok()) return status;
+    Status status = RunSteps(arguments);
+    Status undone = status.Ok() ? Status() : RunText("rollback to savepoint kelp_block");
+    Status released = RunText("release savepoint kelp_block");
+    if (!undone.Ok()) return undone;
+    return status.Ok() ? released : status;
+}
+
+// A statement of the library's own.
+Status Statement::RunText(std::string_view sql) {
+    std::unique_ptr<engine::Query> query;
+    std::uint32_t offset = 0;
+    Rows none;
+    engine::ArrayOutcome outcome;
+    if (Status status = Engine().Prepare(sql, query, offset); !status.Ok()) return status;
+    if (Status status = query->ExecuteArray(none, 0, 1, false, outcome); !status.Ok()) return status;
+    return outcome.failures.empty() ? Status() : std::move(outcome.failures.front().status);
+}
+
+Status Statement::RunSteps(const ExecuteArguments& arguments) {
     for (ub4 row = arguments.first; row < arguments.iterations; ++row) {
         for (std::size_t index = 0; index < scanned_.steps.size(); ++index) {
             if (Status status = RunStep(index, row); !status.Ok()) return status;

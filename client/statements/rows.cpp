@@ -23,15 +23,17 @@ int LoadCollected(Bind& bind, engine::Datum& value) {
 }  // namespace
 
 Status Statement::Rows::Collect(const Statement& statement, const Compiled& compiled) {
+    const std::vector<std::uint32_t>& placeholders = compiled.text.placeholders;
     slots_.clear();
-    slots_.reserve(compiled.text.placeholders.size());
-    for (const std::uint32_t placeholder : compiled.text.placeholders) {
+    slots_.reserve(placeholders.size());
+    for (const std::uint32_t placeholder : placeholders) {
         Bind* bind = statement.bound_[placeholder];
         if (!bind) return Error(kNotAllBound);
-        const auto first = std::find_if(slots_.begin(), slots_.end(),
-                                        [bind](const Slot& slot) { return slot.bind == bind; });
-        const auto same_as = static_cast<std::size_t>(first - slots_.begin());
-        slots_.push_back({bind, same_as, statement.scanned_.placeholders[placeholder].is_row_id});
+        const sql::Placeholder& named = statement.scanned_.placeholders[placeholder];
+        const auto first = std::lower_bound(placeholders.begin(), placeholders.end(), named.first);
+        auto same_as = static_cast<std::size_t>(first - placeholders.begin());
+        if (same_as >= slots_.size() || slots_[same_as].bind != bind) same_as = slots_.size();
+        slots_.push_back({bind, same_as, named.is_row_id});
     }
     return {};
 }

@@ -181,6 +181,8 @@ private:
 
     // block.cpp
     Status RunBlock(const ExecuteArguments& arguments);
+    Status RunSteps(const ExecuteArguments& arguments);
+    Status RunText(std::string_view sql);
     Status RunStep(std::size_t index, ub4 row);
     Status OpenCursor(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row);
     Status RunElement(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row, std::size_t element);

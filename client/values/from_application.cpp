@@ -94,12 +94,12 @@ int FromDecimal(const Source& source, Workspace& workspace, Datum& datum) {
     return SetNumber(number, workspace, datum);
 }
 
-}  // namespace
-
 int SetDate(const date::DateTime& value, Workspace& workspace, Datum& datum) {
     SetView(Kind::timestamp, {workspace.small.data(), date::ToEngineText(value, workspace.small.data())}, datum);
     return 0;
 }
+
+}  // namespace
 
 int FromWholeText(View data, Workspace& workspace, Datum& datum) { return SetText(data, workspace, datum); }
 int FromWholeBytes(View data, Workspace&, Datum& datum) { return SetView(Kind::bytes, data, datum), 0; }

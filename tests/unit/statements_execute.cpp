@@ -289,6 +289,18 @@ TEST_F(Executing, BlockAssignsAndSelectsInto) {
     EXPECT_EQ(Execute(), 1422);
 }
 
+TEST_F(Executing, BlockThatFailsUndoesItself) {
+    MustRun("create table t(a number primary key)");
+    MustRun("insert into t values(1)");
+    EXPECT_EQ(Run("begin insert into t values(2); insert into t values(1); end;"), 1);
+    EXPECT_EQ(One("select group_concat(a) from t"), "1") << "but not the transaction";
+    EXPECT_EQ(Run("begin insert into t values(2); commit; insert into t values(1); end;"), 1);
+    MustRun("rollback");
+    EXPECT_EQ(One("select count(*) from t"), "2");
+    MustRun("begin insert into t values(3); insert into t values(4); end;");
+    EXPECT_EQ(One("select count(*) from t"), "4");
+}
+
 TEST_F(Executing, IndexTableArguments) {
     MustRun("create table t(a number)");
     sb4 numbers[5] = {1, 2, 3, 4, 5};
