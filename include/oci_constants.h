@@ -110,7 +110,7 @@
 #define SQLT_LVC 94             /* sb4 length, then characters */
 #define SQLT_LVB 95             /* address of an OCIRaw * */
 #define SQLT_AFC 96             /* characters, padded with blanks */
-#define SQLT_AVC 97             /* NUL-terminated characters, trailing blanks kept */
+#define SQLT_AVC 97             /* ub2 length, then characters; trailing blanks kept */
 #define SQLT_IBFLOAT 100        /* canonical float */
 #define SQLT_IBDOUBLE 101       /* canonical double */
 #define SQLT_CUR 102            /* address of an OCIStmt * */
