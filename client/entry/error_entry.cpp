@@ -1,6 +1,6 @@
 // Reading error records: OCIErrorGet.
 #include <cstring>
-#include <mutex>
+#include <optional>
 
 #include "handles/gate.h"
 #include "oci.h"
@@ -26,17 +26,15 @@ std::string Message(const Environment& environment, const ErrorList::Record& rec
 }
 
 sword GetRecord(const Environment& environment, const ErrorList& list, ub4 recordno, OraText* sqlstate, sb4* code,
-                OraText* buf, ub4 bufsize) noexcept {
-    if (recordno == 0 || recordno > list.Records().size()) return OCI_NO_DATA;
-    const ErrorList::Record& record = list.Records()[recordno - 1];
-    if (code) *code = record.number;
-    try {
-        if (sqlstate) StoreState(environment, record.number, sqlstate);
-        if (!buf) return OCI_SUCCESS;
-        return TextToBuffer(environment, Message(environment, record), buf, bufsize) ? OCI_SUCCESS : OCI_ERROR;
-    } catch (const std::bad_alloc&) {
-        return OCI_ERROR;
-    }
+                OraText* buf, ub4 bufsize) noexcept try {
+    const std::optional<ErrorList::Record> record = list.At(recordno);
+    if (!record) return OCI_NO_DATA;
+    if (code) *code = record->number;
+    if (sqlstate) StoreState(environment, record->number, sqlstate);
+    if (!buf) return OCI_SUCCESS;
+    return TextToBuffer(environment, Message(environment, *record), buf, bufsize) ? OCI_SUCCESS : OCI_ERROR;
+} catch (const std::bad_alloc&) {
+    return OCI_ERROR;
 }
 
 }  // namespace
@@ -49,6 +47,5 @@ sword OCIErrorGet(dvoid* hndl, ub4 recordno, OraText* sqlstate, sb4* code, OraTe
     }
     Environment* environment = type == OCI_HTYPE_ENV ? Live<Environment>(hndl) : nullptr;
     if (!environment) return OCI_INVALID_HANDLE;
-    const std::lock_guard lock(environment->errors.mutex);
-    return GetRecord(*environment, environment->errors.list, recordno, sqlstate, code, buf, bufsize);
+    return GetRecord(*environment, environment->errors, recordno, sqlstate, code, buf, bufsize);
 }

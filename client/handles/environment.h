@@ -38,12 +38,7 @@ public:
     void* Allocate(std::size_t size);
     void Release(void* memory) noexcept;    // null is harmless
 
-    // The records of calls without an error handle; several threads may make such calls.
-    struct SharedErrors {
-        std::mutex mutex;
-        ErrorList list;
-    };
-    SharedErrors errors;
+    ErrorList errors;    // the records of calls without an error handle
 
     // Kept for the application, without effect here.
     std::uint32_t cache_optimal_size = 8388608;

@@ -9,8 +9,8 @@
 namespace {
 
 Status FirstCode(ErrorHandle& error, AttributeValue& value) {
-    const auto& records = error.list.Records();
-    value.integer = records.empty() ? 0 : static_cast<std::uint64_t>(records.front().number);
+    const auto first = error.list.At(1);
+    value.integer = first ? static_cast<std::uint64_t>(first->number) : 0;
     return {};
 }
 
@@ -32,7 +32,30 @@ std::string ErrorMessage(int number, std::string_view engine, std::string_view d
 }
 
 void ErrorList::Add(const Status& status) {
-    if (status.Number() != 0) records_.push_back({status.Number(), status.Engine(), status.Detail()});
+    if (status.Number() == 0) return;
+    const std::lock_guard lock(mutex_);
+    records_.push_back({status.Number(), status.Engine(), status.Detail()});
+    any_.store(true, std::memory_order_relaxed);
+}
+
+void ErrorList::TakeFrom(ErrorList& other) noexcept {
+    const std::scoped_lock lock(mutex_, other.mutex_);
+    records_ = std::move(other.records_);
+    other.records_.clear();
+    other.any_.store(false, std::memory_order_relaxed);
+    any_.store(!records_.empty(), std::memory_order_relaxed);
+}
+
+std::optional<ErrorList::Record> ErrorList::At(std::size_t position) const {
+    const std::lock_guard lock(mutex_);
+    if (position == 0 || position > records_.size()) return std::nullopt;
+    return records_[position - 1];
+}
+
+void ErrorList::Empty() noexcept {
+    const std::lock_guard lock(mutex_);
+    records_.clear();
+    any_.store(false, std::memory_order_relaxed);
 }
 
 std::span<const AttributeRow> ErrorHandle::Attributes() const { return kRows; }

@@ -1,7 +1,10 @@
 // Error records: number, SQLSTATE and text of what a call had to say. They hang on an error handle or an environment.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
+#include <mutex>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -16,7 +19,8 @@ std::string_view SqlState(int number) noexcept;
 // "[KELP/<ENGINE>] ORA-nnnnn: <text>", then ": " and the engine's own words where it had some, and a line feed.
 std::string ErrorMessage(int number, std::string_view engine, std::string_view detail);
 
-// The records of the last call. Recording formats nothing: texts are put together when they are asked for.
+// The records of the last call. Recording formats nothing: texts are put together when they are asked for. Threads that
+// share a list see each other's records, but nothing worse.
 class ErrorList {
 public:
     struct Record {
@@ -25,11 +29,19 @@ public:
         std::string detail;
     };
 
-    void Clear() noexcept { records_.clear(); }
+    void Clear() noexcept {
+        if (any_.load(std::memory_order_relaxed)) Empty();    // most calls find nothing and lock nothing
+    }
     void Add(const Status& status);    // nothing for a status without a number; throws std::bad_alloc
-    [[nodiscard]] const std::vector<Record>& Records() const { return records_; }
+    void TakeFrom(ErrorList& other) noexcept;
+    // The record at a position, from 1; nothing beyond the last. A copy: throws std::bad_alloc.
+    [[nodiscard]] std::optional<Record> At(std::size_t position) const;
 
 private:
+    void Empty() noexcept;
+
+    mutable std::mutex mutex_;
+    std::atomic<bool> any_{false};
     std::vector<Record> records_;
 };
 

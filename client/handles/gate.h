@@ -98,7 +98,6 @@ sword EnterEnvironment(const void* parent, Body&& body) noexcept {
     if (!environment) return OCI_INVALID_HANDLE;
     ErrorList records;
     const sword code = Guard(records, [&] { return body(*environment); });
-    const std::lock_guard lock(environment->errors.mutex);
-    environment->errors.list = std::move(records);
+    environment->errors.TakeFrom(records);
     return code;
 }
