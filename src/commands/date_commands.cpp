@@ -40,7 +40,8 @@ void RunFromText(int count, char** words) {
     TextArgument date;
     TextArgument format;
     TextArgument language;
-    if (!SetTextWords(date, words + 2) || !SetTextWords(format, words + 4) || !SetTextWords(language, words + 6)) return;
+    if (!SetTextWords(date, words + 2) || !SetTextWords(format, words + 4)) return;
+    if (!SetTextWords(language, words + 6)) return;
     ResultPlace<OCIDate> result(count, words, 8);
     const sword rc = Call(&ClientLibrary::OCIDateFromText, error, date.Text(), date.Length(), format.Text(),
                           static_cast<ub1>(format.Length()), language.Text(), language.Length(), result.Pointer());
@@ -70,8 +71,8 @@ void RunSysDate(int count, char** words) {
     if (rc == OCI_SUCCESS && wanted && result.Pointer() != nullptr) PrintDate(result.Value());
 }
 
-// An area that a text of at most `size` bytes fits in. A size below 0, which the library takes for a huge one, gets an area
-// larger than any text of a date.
+// An area that a text of at most `size` bytes fits in. A size below 0, which the library takes for a huge one, gets an
+// area larger than any text of a date.
 class TextOutput {
 public:
     // Null after a complaint when there is no memory.

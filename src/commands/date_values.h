@@ -4,8 +4,8 @@
 #include "commands/value_operation.h"
 #include "objects/value_display.h"
 
-// Copies the date into the first element of the SQLT_ODT buffer that the word names. "null" stores nothing; any other word
-// that names no such buffer is complained about.
+// Copies the date into the first element of the SQLT_ODT buffer that the word names. "null" stores nothing; any other
+// word that names no such buffer is complained about.
 void StoreDate(const char* word, const OCIDate& date);
 
 // A line for each flag that a check of a date or datetime has set.

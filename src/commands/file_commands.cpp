@@ -23,7 +23,7 @@ void TraceAndReport(int code, const Handles& handles, sword rc, const char* name
     ReturnCodeReport(handles.error, rc);
 }
 
-// --- The package ------------------------------------------------------------------------------------------------------
+// --- The package -----------------------------------------------------------------------------------------------------
 
 struct PackageCommand : CommandRow {
     LibraryFunction<sword(void*, OCIError*)> ClientLibrary::*function;
@@ -37,7 +37,7 @@ void RunPackage(const PackageCommand& row, int, char** words) {
     TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error), "");
 }
 
-// --- An open file -----------------------------------------------------------------------------------------------------
+// --- An open file ----------------------------------------------------------------------------------------------------
 
 struct FileCommand : CommandRow {
     LibraryFunction<sword(void*, OCIError*, OCIFileObject*)> ClientLibrary::*function;
@@ -120,7 +120,7 @@ void RunSeek(int, char** words) {
     TraceAndReport(kSeek, handles, rc, words[3]);
 }
 
-// --- A file by its name -----------------------------------------------------------------------------------------------
+// --- A file by its name ----------------------------------------------------------------------------------------------
 
 template <class Answer> struct NamedFileCommand : CommandRow {
     LibraryFunction<sword(void*, OCIError*, OraText*, OraText*, Answer*)> ClientLibrary::*function;

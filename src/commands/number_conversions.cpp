@@ -17,7 +17,7 @@ enum Code {
     kFromInt = 234, kFromReal = 235, kFromText = 236, kToInt = 260, kToReal = 261, kToRealArray = 262, kToText = 263
 };
 
-// --- Reals ------------------------------------------------------------------------------------------------------------
+// --- Reals -----------------------------------------------------------------------------------------------------------
 
 bool IsRealWidth(int width) {
     return width == 4 || width == 8 || width == 16;
@@ -79,7 +79,8 @@ void RunToReal(int count, char** words) {
     if (NumberFromReal(place, width, error.Get(), *result.Pointer())) result.PrintAndStore(error.Get());
 }
 
-// A block for `count` elements of `size` bytes, or a null pointer after a complaint. A negative size is more than there is.
+// A block for `count` elements of `size` bytes, or a null pointer after a complaint. A negative size is more than there
+// is.
 template <class T> Memory<T> Elements(size_t count, long size, const char* complaint) {
     Memory<T> block(static_cast<T*>(GetMem(size < 0 ? SIZE_MAX : count * static_cast<size_t>(size))));
     if (block == nullptr) MessageText(kError, complaint);
@@ -119,7 +120,7 @@ void RunToRealArray(int count, char** words) {
     }
 }
 
-// --- Integers ---------------------------------------------------------------------------------------------------------
+// --- Integers --------------------------------------------------------------------------------------------------------
 
 // An integer of 1, 2, 4 or 8 bytes. Of any other width there is none, and the library gets a null pointer.
 class Integer {
@@ -179,11 +180,11 @@ void RunToInt(int count, char** words) {
     if (rc == OCI_SUCCESS) integer.Print();
 }
 
-// --- Texts ------------------------------------------------------------------------------------------------------------
+// --- Texts -----------------------------------------------------------------------------------------------------------
 
 constexpr int kLargestTextSize = 100;
-// What the library really gets: no text of a number is longer, so that a size below 0, which it takes for a huge one, does
-// no harm.
+// What the library really gets: no text of a number is longer, so that a size below 0, which it takes for a huge one,
+// does no harm.
 OraText text_area[32 * 1024];
 
 // A text and, in the word after it, its length.

@@ -47,8 +47,8 @@ template <class Object> Object* Find(const char* word) {
     return Resolve<Object>(Traits<Object>::kKind, word);
 }
 
-// The object that an assignment or a resize works on. A name that is not known yet gets the object that the library makes
-// of a null pointer.
+// The object that an assignment or a resize works on. A name that is not known yet gets the object that the library
+// makes of a null pointer.
 template <class Object> class Target {
 public:
     explicit Target(const char* word) : word_(word), slot_(FindByName(Traits<Object>::kKind, word)) {

@@ -1,5 +1,5 @@
-// The commands of the library's thread package. Its objects (mutexes, keys, thread identifiers, thread handles) are named
-// alike, so a row and the type of its function say what a command does.
+// The commands of the library's thread package. Its objects (mutexes, keys, thread identifiers, thread handles) are
+// named alike, so a row and the type of its function say what a command does.
 #include <cstring>
 
 #include "commands/families.h"
@@ -33,7 +33,7 @@ void TraceAndReport(int code, const Handles& handles, sword rc, const char* name
     ReturnCodeReport(handles.error, rc);
 }
 
-// --- The process and the package --------------------------------------------------------------------------------------
+// --- The process and the package -------------------------------------------------------------------------------------
 
 void RunProcessInit(int, char**) {
     Call(&ClientLibrary::OCIThreadProcessInit);
@@ -59,7 +59,7 @@ void RunPackage(const PackageCommand& row, int, char** words) {
     TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error), words[1]);
 }
 
-// --- Making and destroying named objects ------------------------------------------------------------------------------
+// --- Making and destroying named objects -----------------------------------------------------------------------------
 
 template <class Object> struct Making : CommandRow {
     LibraryFunction<sword(void*, OCIError*, Object**)> ClientLibrary::*function;
@@ -119,7 +119,7 @@ template <class Object> void RunDestroying(const Destroying<Object>& row, int, c
     if (rc == OCI_SUCCESS) Release(kKind<Object>, words[3]);
 }
 
-// --- Using one object -------------------------------------------------------------------------------------------------
+// --- Using one object ------------------------------------------------------------------------------------------------
 
 template <class Object> struct Use : CommandRow {
     LibraryFunction<sword(void*, OCIError*, Object*)> ClientLibrary::*function;
@@ -143,14 +143,14 @@ template <class Object> void RunUse(const Use<Object>& row, int, char** words) {
     TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error, object), words[3]);
 }
 
-// --- Values of keys ---------------------------------------------------------------------------------------------------
+// --- Values of keys --------------------------------------------------------------------------------------------------
 
 struct KeyText {
     char text[80];
 };
 
-// Where a key's text lies: in its slot, since the library hands it out until the key is set anew. Keys without a name share
-// one place.
+// Where a key's text lies: in its slot, since the library hands it out until the key is set anew. Keys without a name
+// share one place.
 KeyText& KeyTextOf(const char* key) {
     static KeyText unnamed;
     const NamedObject* const slot = FindByName(Kind::key, key);
@@ -181,7 +181,7 @@ void RunKeyGet(int count, char** words) {
     Message(kOutput, "OCIThreadKeyGet - %s\n", value == nullptr ? "null" : static_cast<const char*>(value));
 }
 
-// --- Thread identifiers -----------------------------------------------------------------------------------------------
+// --- Thread identifiers ----------------------------------------------------------------------------------------------
 
 void RunIdSet(int, char** words) {
     const Handles handles(words);
@@ -212,7 +212,7 @@ void RunIdNull(int count, char** words) {
     if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "OCIThreadIdNull - %d\n", is_null);
 }
 
-// --- Threads ----------------------------------------------------------------------------------------------------------
+// --- Threads ---------------------------------------------------------------------------------------------------------
 
 void RunCreate(int, char** words) {
     const Handles handles(words);

@@ -1,6 +1,6 @@
 // What the commands on numbers and on dates share: a library function that takes an error handle, some operands and the
-// place of its result. The type of the function says how the words are read and what is done with the result; a row says
-// which function it is. The words are the error handle, one word an operand, and an optional one for the result.
+// place of its result. The type of the function says how the words are read and what is done with the result; a row
+// says which function it is. The words are the error handle, one word an operand, and an optional one for the result.
 #pragma once
 
 #include <tuple>
@@ -13,8 +13,8 @@
 #include "report/return_code.h"
 #include "report/trace.h"
 
-// The error handle, looked up when it is first needed. Numbers are read with its help, dates without: that decides which
-// of two bad words is complained about first.
+// The error handle, looked up when it is first needed. Numbers are read with its help, dates without: that decides
+// which of two bad words is complained about first.
 class ErrorWord {
 public:
     explicit ErrorWord(const char* word) : word_(word) {}
