@@ -8,6 +8,7 @@ namespace {
 // A call that asks an error handle about itself leaves its records alone.
 template <class Body>
 sword EnterAttribute(const void* object, ub4 type, OCIError* errhp, Body&& body) noexcept {
+    const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
     Object* target = Live<Object>(object);

@@ -40,6 +40,7 @@ sword GetRecord(const Environment& environment, const ErrorList& list, ub4 recor
 }  // namespace
 
 sword OCIErrorGet(dvoid* hndl, ub4 recordno, OraText* sqlstate, sb4* code, OraText* buf, ub4 bufsize, ub4 type) {
+    const CallInFlight call;
     if (type == OCI_HTYPE_ERROR) {
         const ErrorHandle* error = Live<ErrorHandle>(hndl);
         if (!error) return OCI_INVALID_HANDLE;

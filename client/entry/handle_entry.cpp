@@ -155,6 +155,7 @@ sword OCIHandleAlloc(const dvoid* parent, dvoid** out, ub4 type, size_t extra, d
 }
 
 sword OCIHandleFree(dvoid* hndl, ub4 type) {
+    const CallInFlight call;
     Object* object = Freeable(kHandles, hndl, type);
     return object ? Free(*object) : OCI_INVALID_HANDLE;
 }
@@ -166,6 +167,7 @@ sword OCIDescriptorAlloc(const dvoid* parent, dvoid** out, ub4 type, size_t extr
 }
 
 sword OCIDescriptorFree(dvoid* desc, ub4 type) {
+    const CallInFlight call;
     Object* object = Freeable(kDescriptors, desc, type);
     return object ? Free(*object) : OCI_INVALID_HANDLE;
 }
@@ -178,6 +180,7 @@ sword OCIArrayDescriptorAlloc(const dvoid* parent, dvoid** array, ub4 type, ub4 
 
 sword OCIArrayDescriptorFree(dvoid** array, ub4 type) {
     if (!array) return OCI_INVALID_HANDLE;
+    const CallInFlight call;
     Object* first = Freeable(kDescriptors, array[0], type);
     auto* whole = first ? Live<DescriptorArray>(first->Parent()) : nullptr;
     return whole ? Free(*whole) : OCI_INVALID_HANDLE;

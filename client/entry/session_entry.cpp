@@ -172,15 +172,16 @@ sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
         Server* server = Live<Server>(handle);
         if (auto* service = Live<ServiceContext>(handle)) {
             Session* session = service->GetSession();
-            if (session && session->Begun()) {
-                act(*session->GetLink());
-                return {};
-            }
-            return service->RequireServer(server);
+            const std::shared_ptr<Link> link = session ? session->ShareLink() : nullptr;
+            if (!link) return service->RequireServer(server);
+            act(*link);
+            return {};
         }
         if (!server) return InvalidHandle();
         if (!server->Attached()) return Error(3114);
-        for (Session* session : server->Sessions()) act(*session->GetLink());
+        for (const Session* session : server->Sessions()) {
+            if (const std::shared_ptr<Link> link = session->ShareLink()) act(*link);
+        }
         return {};
     });
 }

@@ -87,12 +87,14 @@ const Variable* Find(const OCIEnv* env, const Handle* pointer) {
 
 template <class Handle>
 void* Contents(const OCIEnv* env, const Handle* pointer) {
+    const CallInFlight call;
     const Variable* object = Find(env, pointer);
     return object ? object->Data() : nullptr;
 }
 
 template <class Handle>
 ub4 Size(const OCIEnv* env, const Handle* pointer) {
+    const CallInFlight call;
     const Variable* object = Find(env, pointer);
     return object ? object->Size() : 0;
 }

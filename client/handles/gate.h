@@ -1,6 +1,6 @@
-// The gate that every exported function passes: checks the error handle and the object (null, foreign and freed
-// pointers get OCI_INVALID_HANDLE and no record), empties the records, runs the body, turns what it answers or throws
-// into a record and the return code. Bodies answer a Status and may throw.
+// The gate that every exported function passes: marks the call as in flight, checks the error handle and the object
+// (null, foreign and freed pointers get OCI_INVALID_HANDLE and no record), empties the records, runs the body, turns what
+// it answers or throws into a record and the return code. Bodies answer a Status and may throw.
 //
 //   sword OCIPing(OCISvcCtx* svchp, OCIError* errhp, ub4) {
 //       return Enter<ServiceContext>(svchp, errhp, [](ServiceContext& service) { return service.Ping(); });
@@ -8,13 +8,12 @@
 #pragma once
 
 #include <exception>
-#include <memory>
-#include <mutex>
 #include <new>
 #include <utility>
 
 #include "handles/environment.h"
 #include "handles/error_handle.h"
+#include "handles/in_flight.h"
 #include "oci.h"
 
 constexpr int kOutOfMemory = 1019;
@@ -23,20 +22,6 @@ constexpr int kNullArgument = 21560;    // an argument is null or out of range
 
 // Adds the record of a status and answers its return code.
 sword Record(ErrorList& list, const Status& status) noexcept;
-
-// Held while a call on an object runs, which may destroy the object; nothing in environments without threads.
-class SerialLock {
-public:
-    explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) : mutex_(std::move(mutex)) {
-        if (mutex_) mutex_->lock();
-    }
-    ~SerialLock() { if (mutex_) mutex_->unlock(); }
-    SerialLock(const SerialLock&) = delete;
-    SerialLock& operator=(const SerialLock&) = delete;
-
-private:
-    std::shared_ptr<std::recursive_mutex> mutex_;
-};
 
 // Runs a body and records into `list`.
 template <class Body>
@@ -53,27 +38,29 @@ sword Guard(ErrorList& list, Body&& body) noexcept {
     }
 }
 
-// Calls that have an object and an error handle: body(T&).
+// Calls that have an object and an error handle, and need both: body(T&, ErrorHandle&).
 template <class T, class Body>
-sword Enter(const void* object, OCIError* errhp, Body&& body) noexcept {
+sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept {
+    const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
     error->list.Clear();
     T* target = Live<T>(object);
     if (!target) return OCI_INVALID_HANDLE;
     const SerialLock lock(target->Serial());
-    return Guard(error->list, [&] { return body(*target); });
+    return Guard(error->list, [&] { return body(*target, *error); });
 }
 
-// The same for bodies that need the error handle too: body(T&, ErrorHandle&).
+// The same for bodies that answer with a status alone: body(T&).
 template <class T, class Body>
-sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept {
-    return Enter<T>(object, errhp, [&](T& target) { return body(target, *Live<ErrorHandle>(errhp)); });
+sword Enter(const void* object, OCIError* errhp, Body&& body) noexcept {
+    return EnterWithError<T>(object, errhp, [&](T& target, ErrorHandle&) { return body(target); });
 }
 
 // Calls that have nothing but an error handle: body(ErrorHandle&).
 template <class Body>
 sword EnterError(OCIError* errhp, Body&& body) noexcept {
+    const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
     error->list.Clear();
@@ -83,6 +70,7 @@ sword EnterError(OCIError* errhp, Body&& body) noexcept {
 // Calls whose first argument is an environment or a session handle: body(Environment&).
 template <class Body>
 sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
+    const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
     error->list.Clear();
@@ -94,6 +82,7 @@ sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
 // Calls that have nothing but a parent environment; what goes wrong is recorded there: body(Environment&).
 template <class Body>
 sword EnterEnvironment(const void* parent, Body&& body) noexcept {
+    const CallInFlight call;
     Environment* environment = Live<Environment>(parent);
     if (!environment) return OCI_INVALID_HANDLE;
     ErrorList records;

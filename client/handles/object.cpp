@@ -2,6 +2,13 @@
 #include "handles/object.h"
 
 #include "handles/environment.h"
+#include "handles/in_flight.h"
+
+namespace {
+
+constinit thread_local bool destroying = false;    // this thread is, and what it destroys destroys others
+
+}  // namespace
 
 std::string& Object::KeptText(std::uint32_t attribute) {
     for (auto& [kept, text] : kept_texts_) {
@@ -40,18 +47,35 @@ void ObjectTree::Unlink(Object& object) noexcept {
     object.previous_ = object.next_ = nullptr;
 }
 
+// Takes the object and all below it out of the set of living objects.
+void ObjectTree::Withdraw(Object& object) noexcept {
+    live::Erase(&object);
+    for (Object* child = object.first_child_; child; child = child->next_) Withdraw(*child);
+}
+
+// What dies with something else dies at once: nothing below it is found any more.
 void ObjectTree::Destroy(Object* object) noexcept {
     Unlink(*object);
-    DestroyUnlinked(object);
+    if (destroying) return DestroyTree(object);
+    {
+        const std::lock_guard lock(object->Env().tree_mutex_);
+        Withdraw(*object);
+    }
+    if (in_flight::MayDestroy(*object)) DestroyTree(object);
 }
 
 // The youngest child first: what was made later may lean on what was made before.
-void ObjectTree::DestroyUnlinked(Object* object) noexcept {
-    live::Erase(object);
+void ObjectTree::DestroyTree(Object* object) noexcept {
+    const bool outermost = !std::exchange(destroying, true);
+    live::Erase(object);    // it may have come after its parent was withdrawn
     while (Object* child = object->first_child_) Destroy(child);
     Environment& environment = object->Env();
     environment.Release(object->user_memory_);
-    if (object == static_cast<Object*>(&environment)) return environment.Close();
-    object->~Object();
-    environment.Release(object);
+    if (object == static_cast<Object*>(&environment)) {
+        environment.Close();
+    } else {
+        object->~Object();
+        environment.Release(object);
+    }
+    if (outermost) destroying = false;
 }

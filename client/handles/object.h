@@ -69,14 +69,30 @@ protected:
 
 private:
     friend class ObjectTree;
+    friend class RetiredObjects;
     Environment* environment_;
     Object* parent_;
     Object* first_child_ = nullptr;
     Object* previous_ = nullptr;
     Object* next_ = nullptr;
+    std::uint64_t retired_ = 0;    // the epoch, once it is
     void* user_memory_ = nullptr;
     std::vector<std::pair<std::uint32_t, std::string>> kept_texts_;
     TypeCode type_;
+};
+
+// Held while a call on an object runs, which may destroy the object; nothing in environments without threads.
+class SerialLock {
+public:
+    explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) : mutex_(std::move(mutex)) {
+        if (mutex_) mutex_->lock();
+    }
+    ~SerialLock() { if (mutex_) mutex_->unlock(); }
+    SerialLock(const SerialLock&) = delete;
+    SerialLock& operator=(const SerialLock&) = delete;
+
+private:
+    std::shared_ptr<std::recursive_mutex> mutex_;
 };
 
 // Makes and destroys objects; the links between them are the tree's alone. Safe from several threads.
@@ -87,12 +103,14 @@ public:
     static void Unreserve(Environment& environment, void* memory) noexcept;
     // Hangs the object below its parent and makes it live. Throws std::bad_alloc and changes nothing then.
     static void Adopt(Object& object, Kind kind, std::size_t extra);
-    // Destroys the object and all below it.
+    // Destroys the object and all below it; later, when another thread is inside a call.
     static void Destroy(Object* object) noexcept;
 
 private:
+    friend class RetiredObjects;
     static void Unlink(Object& object) noexcept;
-    static void DestroyUnlinked(Object* object) noexcept;
+    static void Withdraw(Object& object) noexcept;
+    static void DestroyTree(Object* object) noexcept;
 };
 
 // The set of living objects. Contains and KindOf are lock-free and read nothing but the set.

@@ -3,13 +3,29 @@
 
 #include <utility>
 
+#include "handles/object.h"
+
+std::shared_ptr<Link> LinkShare::Share() const {
+    const std::lock_guard lock(mutex_);
+    return link_;
+}
+
+std::shared_ptr<std::recursive_mutex> LinkShare::Serial() const {
+    const std::shared_ptr<Link> link = Share();
+    return link ? link->Serial() : nullptr;
+}
+
+std::shared_ptr<Link> LinkShare::Set(std::shared_ptr<Link> link) noexcept {
+    const std::lock_guard lock(mutex_);
+    return std::exchange(link_, std::move(link));
+}
+
 LinkUser::~LinkUser() { Use(nullptr); }
 
 void LinkUser::Use(std::shared_ptr<Link> link) noexcept {
-    if (link == link_) return;
-    if (link_) link_->Remove(*this);
-    link_ = std::move(link);
-    if (link_) link_->Add(*this);
+    if (link == UsedLink()) return;
+    if (const std::shared_ptr<Link> before = link_.Set(std::move(link))) before->Remove(*this);
+    if (UsedLink()) UsedLink()->Add(*this);
 }
 
 Link::Link(std::unique_ptr<engine::Connection> connection, bool threaded)
@@ -48,6 +64,7 @@ void Link::ForgetCancel() noexcept {
 }
 
 std::unique_ptr<engine::Connection> Link::Close() noexcept {
+    const SerialLock serial(serial_);    // calls on statements of the link may be running
     while (LinkUser* user = AnyUser()) {
         user->LinkClosed();
         user->Use(nullptr);

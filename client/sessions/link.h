@@ -11,6 +11,20 @@
 
 class Link;
 
+// A share of a link. It changes under the link's serial lock, whose holder reads it freely; who does not hold that lock
+// takes a share of his own.
+class LinkShare {
+public:
+    [[nodiscard]] const std::shared_ptr<Link>& Get() const { return link_; }
+    [[nodiscard]] std::shared_ptr<Link> Share() const;
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() const;
+    std::shared_ptr<Link> Set(std::shared_ptr<Link> link) noexcept;    // answers the one before
+
+private:
+    mutable std::mutex mutex_;    // between Share and Set
+    std::shared_ptr<Link> link_;
+};
+
 // Somebody who holds queries or other things of the connection: told before it goes.
 class LinkUser {
 public:
@@ -25,11 +39,12 @@ protected:
 
     // Joins a link, leaving the one before; null only leaves.
     void Use(std::shared_ptr<Link> link) noexcept;
-    [[nodiscard]] const std::shared_ptr<Link>& UsedLink() const { return link_; }
+    [[nodiscard]] const std::shared_ptr<Link>& UsedLink() const { return link_.Get(); }
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> LinkSerial() const { return link_.Serial(); }
 
 private:
     friend class Link;
-    std::shared_ptr<Link> link_;
+    LinkShare link_;
     LinkUser* previous_ = nullptr;
     LinkUser* next_ = nullptr;
 };

@@ -62,11 +62,23 @@ Server::~Server() { DropSessions(); }
 
 std::span<const AttributeRow> Server::Attributes() const { return kRows; }
 
+void Server::Join(Session& session) {
+    const std::lock_guard lock(mutex_);
+    sessions_.push_back(&session);
+}
+
+void Server::Leave(Session& session) noexcept {
+    const std::lock_guard lock(mutex_);
+    std::erase(sessions_, &session);
+}
+
 Status Server::Attach(std::string_view database) {
-    if (attached_) return Error(kAlreadyAttached);
+    if (Attached()) return Error(kAlreadyAttached);
     std::unique_ptr<engine::Connection> connection;
     Status status = engine::Connect(database, connection);
     if (status.Failed()) return status;
+    const std::lock_guard lock(mutex_);
+    if (attached_) return Error(kAlreadyAttached);
     database_ = database;
     version_ = connection->ServerVersion();
     spare_ = std::move(connection);
@@ -75,25 +87,40 @@ Status Server::Attach(std::string_view database) {
 }
 
 Status Server::Detach() {
-    if (!attached_) return Error(kNotConnected);
+    if (!Attached()) return Error(kNotConnected);
     DropSessions();
-    spare_.reset();
+    std::unique_ptr<engine::Connection> spare;    // closed when the lock is given up
+    const std::lock_guard lock(mutex_);
+    spare = std::move(spare_);
     attached_ = false;
     database_.clear();
     return {};
 }
 
+Session* Server::AnySession() noexcept {
+    const std::lock_guard lock(mutex_);
+    return sessions_.empty() ? nullptr : sessions_.back();
+}
+
 void Server::DropSessions() noexcept {
-    while (!sessions_.empty()) sessions_.back()->Drop();
+    while (Session* session = AnySession()) {
+        session->Drop();
+        Leave(*session);
+    }
 }
 
 Status Server::TakeConnection(std::unique_ptr<engine::Connection>& connection) {
-    if (!attached_) return Error(kNotConnected);
-    if (!spare_) return engine::Connect(database_, connection);
-    connection = std::move(spare_);
-    return {};
+    std::string database;
+    {
+        const std::lock_guard lock(mutex_);
+        if (!attached_) return Error(kNotConnected);
+        connection = std::move(spare_);
+        database = database_;
+    }
+    return connection ? Status() : engine::Connect(database, connection);
 }
 
 void Server::GiveBack(std::unique_ptr<engine::Connection> connection) noexcept {
+    const std::lock_guard lock(mutex_);
     if (attached_ && !spare_) spare_ = std::move(connection);
 }

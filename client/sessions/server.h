@@ -1,8 +1,10 @@
-// Server handles: the database that user sessions are begun on.
+// Server handles: the database that user sessions are begun on. Sessions of one server may begin and end in several
+// threads.
 #pragma once
 
 #include <cstdint>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -19,10 +21,10 @@ public:
     explicit Server(const Origin& origin, bool own = false) : Object(origin), own_(own) {}
     ~Server() override;
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
-    [[nodiscard]] bool InUse() const override { return own_ || !sessions_.empty(); }
+    [[nodiscard]] bool InUse() const override { return own_ || !Sessions().empty(); }
 
-    [[nodiscard]] bool Attached() const { return attached_; }
-    [[nodiscard]] const std::string& Database() const { return database_; }
+    [[nodiscard]] bool Attached() const { return Read(attached_); }
+    [[nodiscard]] const std::string& Database() const { return database_; }    // change with attaching alone
     [[nodiscard]] const std::string& Version() const { return version_; }
 
     Status Attach(std::string_view database);
@@ -32,9 +34,9 @@ public:
     Status TakeConnection(std::unique_ptr<engine::Connection>& connection);
     void GiveBack(std::unique_ptr<engine::Connection> connection) noexcept;
 
-    void Join(Session& session) { sessions_.push_back(&session); }
-    void Leave(Session& session) noexcept { std::erase(sessions_, &session); }
-    [[nodiscard]] const std::vector<Session*>& Sessions() const { return sessions_; }
+    void Join(Session& session);
+    void Leave(Session& session) noexcept;
+    [[nodiscard]] std::vector<Session*> Sessions() const { return Read(sessions_); }    // begun and not ended
 
     std::string internal_name;
     std::string external_name;
@@ -43,11 +45,18 @@ public:
 
 private:
     void DropSessions() noexcept;
+    Session* AnySession() noexcept;
+    template <class T>
+    T Read(const T& member) const {
+        const std::lock_guard lock(mutex_);
+        return member;
+    }
 
     const bool own_;    // made by a logon and below its service context
+    mutable std::mutex mutex_;    // of what follows; nothing else is locked or called while it is held
     bool attached_ = false;
     std::string database_;
     std::string version_;
     std::unique_ptr<engine::Connection> spare_;
-    std::vector<Session*> sessions_;    // begun and not ended
+    std::vector<Session*> sessions_;
 };

@@ -63,11 +63,9 @@ Status ServiceContext::RequireServer(Server*& server) {
 }
 
 Status ServiceContext::Require(std::shared_ptr<Link>& link) {
-    Session* session = GetSession();
-    if (session && session->Begun()) {
-        link = session->GetLink();
-        return {};
-    }
+    const Session* session = GetSession();
+    link = session ? session->ShareLink() : nullptr;
+    if (link) return {};
     Server* server = nullptr;
     Status status = RequireServer(server);
     return status.Failed() ? status : Error(kNotLoggedOn);

@@ -45,7 +45,7 @@ Session::~Session() { Drop(); }
 
 std::span<const AttributeRow> Session::Attributes() const { return kRows; }
 
-std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_ ? link_->Serial() : nullptr; }
+std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_.Serial(); }
 
 Status Session::Begin(Server& server, const engine::Credentials& credentials) {
     if (Begun()) return Error(kAlreadyAuthenticated);
@@ -65,25 +65,21 @@ Status Session::Adopt(Server& server, std::unique_ptr<engine::Connection> connec
     link->user = std::move(user_name);
     server.Join(*this);
     server_ = &server;
-    link_ = std::move(link);
+    link_.Set(std::move(link));
     return {};
 }
 
 Status Session::End() {
     if (!Begun()) return Error(kNotLoggedOn);
-    Status status = link_->Engine().Commit();
-    if (!status.Failed()) Close();
+    Status status = GetLink()->Engine().Commit();
+    if (!status.Failed()) Drop();
     return status;
 }
 
 void Session::Drop() noexcept {
-    if (!Begun()) return;
-    Close();
-}
-
-void Session::Close() noexcept {
-    std::unique_ptr<engine::Connection> connection = link_->Close();
-    link_.reset();
+    const std::shared_ptr<Link> link = link_.Set(nullptr);
+    if (!link) return;
+    std::unique_ptr<engine::Connection> connection = link->Close();
     Server* server = std::exchange(server_, nullptr);
     server->Leave(*this);
     if (connection->InTransaction() && connection->Rollback().Failed()) return;    // no use to anybody

@@ -22,14 +22,15 @@ public:
     [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
     [[nodiscard]] bool InUse() const override { return own_; }
 
-    [[nodiscard]] bool Begun() const { return link_ != nullptr; }
-    [[nodiscard]] const std::shared_ptr<Link>& GetLink() const { return link_; }    // null until begun
+    [[nodiscard]] bool Begun() const { return GetLink() != nullptr; }
+    [[nodiscard]] const std::shared_ptr<Link>& GetLink() const { return link_.Get(); }    // null until begun
+    [[nodiscard]] std::shared_ptr<Link> ShareLink() const { return link_.Share(); }    // without the serial lock
 
     Status Begin(Server& server, const engine::Credentials& credentials);
     // Begins with a connection on which the user has proved who he is.
     Status Adopt(Server& server, std::unique_ptr<engine::Connection> connection, std::string user_name);
     Status End();             // commits; an error leaves the session as it was
-    void Drop() noexcept;     // rolls back
+    void Drop() noexcept;     // rolls back; nothing when not begun
 
     std::string user;
     std::string password;
@@ -44,9 +45,7 @@ public:
     std::uint32_t purity = 0;
 
 private:
-    void Close() noexcept;
-
     const bool own_;
-    std::shared_ptr<Link> link_;
+    LinkShare link_;
     Server* server_ = nullptr;    // while begun
 };

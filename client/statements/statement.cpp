@@ -38,10 +38,7 @@ Statement::~Statement() {
         if (parameter) parameter->statement = nullptr;
 }
 
-std::shared_ptr<std::recursive_mutex> Statement::Serial() {
-    const std::shared_ptr<Link>& link = UsedLink();
-    return link ? link->Serial() : nullptr;
-}
+std::shared_ptr<std::recursive_mutex> Statement::Serial() { return LinkSerial(); }
 
 // What is open and compiled goes before the link does.
 void Statement::LinkClosed() noexcept {

@@ -1,0 +1,124 @@
+// Handles and whole environments that one thread frees while others are inside calls on them.
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <thread>
+#include <vector>
+
+#include "kelpci.h"
+#include "oci.h"
+
+namespace {
+
+const OraText* Text(const char* text) { return reinterpret_cast<const OraText*>(text); }
+
+// What the threads share; each pointer may be freed at any time.
+struct Shared {
+    OCIEnv* env = nullptr;
+    OCIError* err = nullptr;
+    OCISvcCtx* svc = nullptr;
+    OCIStmt* stmt = nullptr;
+    OCIString* string = nullptr;
+
+    template <class Handle>
+    void New(Handle*& handle, ub4 type) {
+        ASSERT_EQ(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&handle), type, 0, nullptr), OCI_SUCCESS);
+    }
+    void Make() {
+        ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+        New(err, OCI_HTYPE_ERROR);
+        ASSERT_EQ(OCILogon(env, err, &svc, Text("kelp"), 4, Text("kelp"), 4, Text(":memory:"), 8), OCI_SUCCESS);
+        New(stmt, OCI_HTYPE_STMT);
+        ASSERT_EQ(OCIStmtPrepare(stmt, err, Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIStringAssignText(env, err, Text("kelp"), 4, &string), OCI_SUCCESS);
+    }
+};
+
+// Answers how many of the calls found their handles.
+int CallOnce(const Shared& shared, int round) {
+    OCINumber number{};
+    sb4 code = 0;
+    ub4 size = 0;
+    OraText text[200];
+    OCIString* string = shared.string;
+    const sword codes[] = {
+        OCINumberFromInt(shared.err, &round, sizeof round, OCI_NUMBER_SIGNED, &number),
+        OCINumberSqrt(shared.err, &number, nullptr),    // leaves a record
+        OCIErrorGet(shared.err, 1, nullptr, &code, text, sizeof text, OCI_HTYPE_ERROR),
+        OCIStringAllocSize(shared.env, shared.err, string, &size),
+        OCIStmtExecute(shared.svc, shared.stmt, shared.err, 0, 0, nullptr, nullptr, OCI_DEFAULT),
+        OCIAttrGet(shared.stmt, OCI_HTYPE_STMT, &size, nullptr, OCI_ATTR_PARAM_COUNT, shared.err),
+    };
+    int found = 0;
+    for (const sword rc : codes) found += rc != OCI_INVALID_HANDLE;
+    return found;
+}
+
+class FreedInFlight : public testing::TestWithParam<void (*)(Shared&)> {};
+
+TEST_P(FreedInFlight, CallsEndAndNothingIsLeft) {
+    const sb4 before = OCI_memGetMemCount();
+    constexpr int kRounds = 30, kThreads = 3;
+    for (int round = 0; round < kRounds; ++round) {
+        Shared shared;
+        shared.Make();
+        std::atomic<int> started{0};
+        std::atomic<bool> stop{false};
+        std::vector<std::thread> threads;
+        for (int index = 0; index < kThreads; ++index) {
+            threads.emplace_back([&, copy = shared] {
+                int found = CallOnce(copy, 1);
+                ++started;
+                for (int call = 2; found > 0 || !stop; ++call) found = CallOnce(copy, call);
+            });
+        }
+        while (started < kThreads) std::this_thread::yield();
+        GetParam()(shared);
+        stop = true;
+        OCIHandleFree(shared.env, OCI_HTYPE_ENV);
+        for (std::thread& thread : threads) thread.join();
+        ASSERT_EQ(OCI_memGetMemCount(), before) << "round " << round;
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Order, FreedInFlight, testing::Values(
+    +[](Shared&) {},    // the environment, and all with it
+    +[](Shared& shared) { OCIHandleFree(shared.err, OCI_HTYPE_ERROR); },
+    +[](Shared& shared) { OCIHandleFree(shared.stmt, OCI_HTYPE_STMT); },
+    +[](Shared& shared) {
+        OCIHandleFree(shared.svc, OCI_HTYPE_SVCCTX);
+        OCIHandleFree(shared.stmt, OCI_HTYPE_STMT);
+    }));
+
+TEST(ServerHandles, SessionsOfOneServerBeginAndEndInSeveralThreads) {
+    Shared shared;
+    shared.Make();
+    OCIServer* server = nullptr;
+    shared.New(server, OCI_HTYPE_SERVER);
+    ASSERT_EQ(OCIServerAttach(server, shared.err, Text(":memory:"), 8, OCI_DEFAULT), OCI_SUCCESS);
+    std::atomic<int> failures{0};
+    std::vector<std::thread> threads;
+    for (int index = 0; index < 4; ++index) {
+        threads.emplace_back([&] {
+            OCIError* err = nullptr;
+            OCISvcCtx* svc = nullptr;
+            OCISession* session = nullptr;
+            shared.New(err, OCI_HTYPE_ERROR);
+            shared.New(svc, OCI_HTYPE_SVCCTX);
+            shared.New(session, OCI_HTYPE_SESSION);
+            failures += OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err) != OCI_SUCCESS;
+            failures += OCIAttrSet(svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION, err) != OCI_SUCCESS;
+            for (int round = 0; round < 20; ++round) {
+                failures += OCISessionBegin(svc, err, session, OCI_CRED_EXT, OCI_DEFAULT) != OCI_SUCCESS;
+                OCIBreak(server, err);
+                OCIReset(server, err);
+                failures += OCISessionEnd(svc, err, session, OCI_DEFAULT) != OCI_SUCCESS;
+            }
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(failures, 0);
+    EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+}  // namespace
