@@ -75,6 +75,28 @@ void ComplainNotFound(std::string_view name) {
     Message(kError, "Handle %.*s not found\n", static_cast<int>(name.size()), name.data());
 }
 
+// The part of a word that names an object: for descriptors, what stands before an index.
+std::string_view NameIn(Kind kind, std::string_view word) {
+    return IsDescriptor(kind) ? word.substr(0, word.find('[')) : word;
+}
+
+// What the word finds in the table, its index obeyed. An index beyond the array, or none, gives the array itself.
+DescriptorReference LookUp(Kind kind, const char* word) {
+    DescriptorReference found;
+    const std::string_view name = NameIn(kind, word);
+    const bool indexed = word[name.size()] != '\0';
+    if (indexed) found.index = DecodeLong(word + name.size() + 1);
+    found.slot = FindByName(kind, name);
+    if (found.slot == nullptr) return found;
+    found.object = found.slot->object;
+    found.is_array = found.slot->array_count != 0;
+    if (found.is_array && indexed && found.index >= 0 && found.index < long{found.slot->array_count}) {
+        found.object = static_cast<void**>(found.object)[found.index];
+        found.is_array = false;
+    }
+    return found;
+}
+
 }  // namespace
 
 const KindInfo& InfoOf(Kind kind) {
@@ -101,28 +123,6 @@ NamedObject* FindByPointer(Kind kind, const void* object) {
     for (NamedObject& slot : SlotsOf(kind))
         if (slot.in_use && slot.object == object) return &slot;
     return nullptr;
-}
-
-// The part of a word that names an object: for descriptors, what stands before an index.
-std::string_view NameIn(Kind kind, std::string_view word) {
-    return IsDescriptor(kind) ? word.substr(0, word.find('[')) : word;
-}
-
-// What the word finds in the table, its index obeyed. An index beyond the array, or none, gives the array itself.
-DescriptorReference LookUp(Kind kind, const char* word) {
-    DescriptorReference found;
-    const std::string_view name = NameIn(kind, word);
-    const bool indexed = word[name.size()] != '\0';
-    if (indexed) found.index = DecodeLong(word + name.size() + 1);
-    found.slot = FindByName(kind, name);
-    if (found.slot == nullptr) return found;
-    found.object = found.slot->object;
-    found.is_array = found.slot->array_count != 0;
-    if (found.is_array && indexed && found.index >= 0 && found.index < long{found.slot->array_count}) {
-        found.object = static_cast<void**>(found.object)[found.index];
-        found.is_array = false;
-    }
-    return found;
 }
 
 DescriptorReference ResolveDescriptor(Kind kind, const char* word) {

@@ -38,8 +38,9 @@ enum class TextArea {
 };
 
 // A text argument with the length typed for it, ready to be passed: in UTF-16 mode the converted text and its length,
-// else the word and the length as typed. The length may be anything; what is passed can be read up to that length (a
-// word is followed by zeros), unless the length is beyond kReadableText, where only the library can say no.
+// else the word and the length as typed. The length may be anything; what is passed can be read up to that length
+// (behind a word comes what its token buffer held before, then zeros), unless the length is beyond kReadableText, where
+// only the library can say no.
 class TextArgument {
 public:
     static constexpr uint32_t kTokenBufferSize = 10000;  // what may be read at a word, whatever its length

@@ -4,7 +4,6 @@
 #include <algorithm>
 #include <chrono>
 #include <cstdlib>
-#include <limits>
 #include <thread>
 
 static_assert(sizeof(long long) == sizeof(std::int64_t));
@@ -15,15 +14,6 @@ std::int64_t StrToInt64(const char* text) {
 
 std::uint64_t StrToUint64(const char* text) {
     return text ? std::strtoull(text, nullptr, 10) : 0;
-}
-
-std::int32_t AtoiRules(const char* text) {
-    using Limits = std::numeric_limits<std::int32_t>;
-    return static_cast<std::int32_t>(std::clamp<std::int64_t>(StrToInt64(text), Limits::min(), Limits::max()));
-}
-
-std::int64_t AtolRules(const char* text) {
-    return StrToInt64(text);
 }
 
 void SleepMilliseconds(std::int64_t milliseconds) {

@@ -8,8 +8,5 @@ std::int64_t StrToInt64(const char* text);
 // A minus sign is read modulo 2^64, as C reads unsigned numbers: "-1" is the largest one.
 std::uint64_t StrToUint64(const char* text);
 
-std::int32_t AtoiRules(const char* text);
-std::int64_t AtolRules(const char* text);
-
 // Returns at once for 0 and below; a signal does not shorten it.
 void SleepMilliseconds(std::int64_t milliseconds);
