@@ -55,8 +55,8 @@ public:
     virtual std::uint32_t PlaceholderCount() const = 0;
 
     // Runs a statement that returns no rows once for each row first..last-1 of the source. Stops at the first failure
-    // (rows before it stay done) unless `all_rows`; failures are in `outcome`, a Status that is an error means that
-    // nothing could be run at all.
+    // (rows before it stay done) unless `all_rows`; failures are in `outcome`. A Status that is an error means that
+    // nothing is done: nothing could be run, or the transaction is gone.
     virtual Status ExecuteArray(RowSource& source, std::uint32_t first, std::uint32_t last, bool all_rows,
                                 ArrayOutcome& outcome) = 0;
 

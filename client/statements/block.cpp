@@ -32,6 +32,7 @@ Status Statement::RunBlock(const ExecuteArguments& arguments) {
     if (Status status = Engine().Begin(); !status.Ok()) return status;
     if (Status status = RunText("savepoint kelp_block"); !status.Ok()) return status;
     Status status = RunSteps(arguments);
+    if (!status.Ok() && !Engine().InTransaction()) return status;    // the engine has undone more than the block
     Status undone = status.Ok() ? Status() : RunText("rollback to savepoint kelp_block");
     Status released = RunText("release savepoint kelp_block");
     if (!undone.Ok()) return undone;

@@ -202,6 +202,7 @@ Status Statement::RunRows(const ExecuteArguments& arguments, engine::ArrayOutcom
         return compiled->query->ExecuteArray(rows, arguments.first, arguments.iterations, all_rows, outcome);
     for (ub4 row = arguments.first; row < arguments.iterations; ++row) {
         Status status = ReturnRow(*compiled, rows, step, row, outcome.affected);
+        if (!status.Ok() && !Engine().InTransaction()) return status;
         if (status.Ok()) ++outcome.executed;
         else outcome.failures.push_back({row, std::move(status)});
         if (!outcome.failures.empty() && !all_rows) break;

@@ -1,4 +1,5 @@
 // The entry: start-up, the loop over standard input, the exit.
+#include <csignal>
 #include <cstring>
 
 #include "core/messages.h"
@@ -38,6 +39,7 @@ void TakePassword(int count, char** arguments) {
 }  // namespace
 
 int main(int count, char** arguments) {
+    std::signal(SIGXFSZ, SIG_IGN);  // a file that may not grow fails the write, as a full disk does
     PrepareMessages();
     SetLoaderComplaint([](const char* text) { MessageText(kError, text); });
     report_library_failure = ReturnCodeReport;

@@ -131,10 +131,11 @@ Status SqliteConnection::Begin() {
     return Run("begin immediate");
 }
 
-// A deferred constraint that fails at the end undoes the transaction.
+// A deferred constraint that fails at the end undoes the transaction, as does a file that cannot take it.
 Status SqliteConnection::Commit() {
     if (!InTransaction()) return {};
     Status status = Run("commit");
+    if (!status.Ok() && !InTransaction()) return RolledBack(status);
     if (status.Number() != 2291 && status.Number() != 2292) return status;
     Status undone = Rollback();
     return undone.Failed() ? undone : Error(kRolledBack, status.Detail()).From("SQLITE");

@@ -1,12 +1,15 @@
 // Result codes and messages of SQLite: one table row a code or a beginning of a message.
 #include "engine/sqlite/errors.h"
 
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
 
 namespace engine::sqlite {
 namespace {
+
+constexpr int kNoRoom = 1653;
 
 struct CodeRow {
     int code;      // extended or primary
@@ -32,7 +35,7 @@ constexpr CodeRow kCodes[] = {
     {SQLITE_IOERR, 1115},
     {SQLITE_CORRUPT, 1578},
     {SQLITE_NOTADB, 1210},
-    {SQLITE_FULL, 1653},
+    {SQLITE_FULL, kNoRoom},
     {SQLITE_CANTOPEN, 12154},
     {SQLITE_PERM, 1031},
     {SQLITE_AUTH, 1031},
@@ -118,6 +121,10 @@ int NumberOf(int code, Verb verb, std::string_view message) {
     return (code & 0xFF) == SQLITE_ERROR ? NumberOfWords(message) : 600;
 }
 
+// A write that has just failed at the limit of the process or the quota of the user: SQLite knows the full disk only,
+// and sqlite3_system_errno() does not tell of commits.
+bool MayNotGrow(int code) { return code == SQLITE_IOERR_WRITE && (errno == EFBIG || errno == EDQUOT); }
+
 // "number detail", from a function of our own.
 Status ToldByFunction(std::string_view words) {
     const std::size_t blank = words.find(' ');
@@ -136,7 +143,14 @@ Status Failure(sqlite3* database, int code, Verb verb) {
     const std::string_view words = sqlite3_errmsg(database);
     if (words.starts_with(kErrorMark)) return ToldByFunction(words.substr(kErrorMark.size()));
     const int told = (extended & 0xFF) == (code & 0xFF) ? extended : code;
-    return Error(NumberOf(told, verb, words), std::string(words)).From("SQLITE");
+    const int number = MayNotGrow(told) ? kNoRoom : NumberOf(told, verb, words);
+    return Error(number, std::string(words)).From("SQLITE");
+}
+
+Status RolledBack(const Status& failure) {
+    std::string detail = failure.Detail();
+    if (!detail.empty()) detail += "; ";
+    return Error(failure.Number(), detail + "the transaction was rolled back").From("SQLITE");
 }
 
 }  // namespace engine::sqlite

@@ -18,6 +18,9 @@ enum class Verb : std::uint8_t { other, insert, update, remove };    // what a s
 // The status of a call that has just failed on the database.
 Status Failure(sqlite3* database, int code, Verb verb = Verb::other);
 
+// A failure that has taken the transaction with it: the record says so, too.
+Status RolledBack(const Status& failure);
+
 // The status of a result code that has no database behind it.
 Status Failure(int code, std::string_view words);
 

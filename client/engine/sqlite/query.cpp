@@ -121,15 +121,17 @@ Status SqliteQuery::BindRow(RowSource& source, std::uint32_t row, bool copy) {
 // A call that was stopped says so, whatever it was in the middle of.
 Status SqliteQuery::Stopped(int code) {
     if (!connection_.Cancelled()) return Failure(connection_.Database(), code, verb_);
-    const bool lost = code == SQLITE_INTERRUPT && !read_only_ && !connection_.InTransaction();
     connection_.ForgetCancel();
-    return Error(kCancelled, lost ? "the transaction was rolled back" : "").From("SQLITE");
+    return Error(kCancelled).From("SQLITE");
 }
 
 Status SqliteQuery::Step(bool& has_row) {
+    const bool in_transaction = connection_.InTransaction();
     const int code = connection_.Cancelled() ? SQLITE_INTERRUPT : sqlite3_step(statement_.get());
     has_row = code == SQLITE_ROW;
-    return has_row || code == SQLITE_DONE ? Status() : Stopped(code & 0xFF);
+    if (has_row || code == SQLITE_DONE) return {};
+    Status status = Stopped(code & 0xFF);
+    return in_transaction && !connection_.InTransaction() ? RolledBack(status) : status;
 }
 
 Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, std::uint64_t& affected) {
@@ -146,12 +148,14 @@ Status SqliteQuery::ExecuteArray(RowSource& source, std::uint32_t first, std::ui
     Close();
     if (!read_only_) connection_.ReadAhead(this);
     connection_.ForgetLastRow();
+    const bool in_transaction = connection_.InTransaction();
     for (std::uint32_t row = first; row < last; ++row) {
         Status status = ExecuteRow(source, row, outcome.affected);
         if (status.Ok()) {
             ++outcome.executed;
             continue;
         }
+        if (in_transaction && !connection_.InTransaction()) return status;
         const bool stop = !all_rows || status.Number() == kCancelled;
         outcome.failures.push_back({row, std::move(status)});
         if (stop) break;
