@@ -111,7 +111,7 @@ bool Table::AddColumnName(ub4 position) {
     ub4 length = 0;
     rc = Call(&ClientLibrary::OCIAttrGet, column, ub4{OCI_DTYPE_PARAM}, &name, &length, ub4{OCI_ATTR_NAME}, error_);
     if (!Check(rc, Failed(rc))) return false;
-    AddPlainText(line_, name, length, Utf16Mode);
+    AddText(line_, name, length, Utf16Mode, Quotes::never);
     return true;
 }
 
@@ -165,7 +165,7 @@ bool Table::ReceivePiece() {
 
 void Table::AddValue(ub4 column) {
     if (indicator_ == OCI_IND_NULL) line_.Character('-');
-    else AddPlainText(line_, value_.data(), value_.size(), Utf16Mode);
+    else AddText(line_, value_.data(), value_.size(), Utf16Mode, Quotes::never);
     line_.Character(column < columns_ ? ',' : '\n');
 }
 

@@ -1,8 +1,6 @@
 // From the words of a line to the command they name.
 #pragma once
 
-#include <cstdio>
-
 #include "core/command_table.h"
 
 inline constexpr int kStopLoop = 13;

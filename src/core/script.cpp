@@ -88,6 +88,14 @@ size_t StackForLevels() {
     return limit.rlim_cur / 2;
 }
 
+// Whether the stack has room for another level of scripts.
+bool RoomForAnotherLevel() {
+    static const size_t kRoom = StackForLevels();
+    static const char* const first = static_cast<const char*>(__builtin_frame_address(0));
+    const auto* here = static_cast<const char*>(__builtin_frame_address(0));
+    return static_cast<size_t>(std::abs(first - here)) < kRoom;
+}
+
 // Opens a script for reading; null for what cannot be read, a folder too, which the system would only refuse later.
 std::FILE* OpenScript(const char* name) {
     std::FILE* file = std::fopen(name, "r");
@@ -105,13 +113,6 @@ void ReadAndEvaluateScript(std::FILE* stream) {
     auto* level = new (room.get()) Level(stream);
     level->Run();
     level->~Level();
-}
-
-bool RoomForAnotherLevel() {
-    static const size_t kRoom = StackForLevels();
-    static const char* const first = static_cast<const char*>(__builtin_frame_address(0));
-    const auto* here = static_cast<const char*>(__builtin_frame_address(0));
-    return static_cast<size_t>(std::abs(first - here)) < kRoom;
 }
 
 void ReadScript(int count, char** words) {

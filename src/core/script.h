@@ -8,6 +8,3 @@ void ReadAndEvaluateScript(std::FILE* stream);
 
 // The `read` command: runs the script that words[1] names.
 void ReadScript(int count, char** words);
-
-// Whether the stack has room for another level of scripts.
-bool RoomForAnotherLevel();

@@ -44,22 +44,6 @@ void SayNotConverted(int rc) {
     Message(kError, "convertFromUTF16 failed: rc = %ld\n", static_cast<long>(rc));
 }
 
-bool AddConverted(Line& line, const void* text, size_t length, const char* before, const char* after) {
-    std::string converted;
-    const int rc = FromUtf16(text, length, converted);
-    if (!IsTolerated(rc)) {
-        line.Print();
-        SayNotConverted(rc);
-        return false;
-    }
-    line.Text(before).Text(converted).Text(after);
-    return true;
-}
-
-std::string_view Bytes(const void* text, size_t length) {
-    return text == nullptr ? std::string_view() : std::string_view(static_cast<const char*>(text), length);
-}
-
 }  // namespace
 
 bool IsTolerated(int result) {
@@ -114,21 +98,21 @@ size_t Utf16Length(const void* text, size_t limit) {
     return length;
 }
 
-bool AddText(Line& line, const void* text, size_t length, bool utf16) {
-    if (utf16) return AddConverted(line, text, length, "W\"", "\"");
-    line.Text(Bytes(text, length));
-    return true;
-}
-
-bool AddPlainText(Line& line, const void* text, size_t length, bool utf16) {
-    if (utf16) return AddConverted(line, text, length, "", "");
-    line.Text(Bytes(text, length));
-    return true;
-}
-
-bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16) {
-    if (utf16) return AddConverted(line, text, length, "W\"", "\"");
-    line.Character('"').Text(Bytes(text, length)).Character('"');
+bool AddText(Line& line, const void* text, size_t length, bool utf16, Quotes quotes) {
+    if (!utf16) {
+        const std::string_view mark = quotes == Quotes::always ? "\"" : "";
+        line.Text(mark).Text({static_cast<const char*>(text), text == nullptr ? 0 : length}).Text(mark);
+        return true;
+    }
+    std::string converted;
+    const int rc = FromUtf16(text, length, converted);
+    if (!IsTolerated(rc)) {
+        line.Print();
+        SayNotConverted(rc);
+        return false;
+    }
+    const bool quoted = quotes != Quotes::never;
+    line.Text(quoted ? "W\"" : "").Text(converted).Text(quoted ? "\"" : "");
     return true;
 }
 

@@ -23,13 +23,14 @@ bool convertFromUTF16(const void* text, size_t length, std::string& output);
 // The bytes of a UTF-16 text before its first zero pair, looking no further than `limit` bytes.
 size_t Utf16Length(const void* text, size_t limit);
 
-// Adds a text of the library to a line: as it is or, when `utf16`, converted and as W"...". After a failed conversion
-// the line is printed as far as it goes, the failure after it, and false returned.
-bool AddText(Line& line, const void* text, size_t length, bool utf16);
-// The same without W"..." around what was converted.
-bool AddPlainText(Line& line, const void* text, size_t length, bool utf16);
-// The same with quotes around a text that is not UTF-16, too.
-bool AddQuotedText(Line& line, const void* text, size_t length, bool utf16);
+// Adds a text of the library to a line, converted when `utf16`. After a failed conversion the line is printed as far as
+// it goes, the failure after it, and false returned.
+enum class Quotes {
+    never,
+    converted,  // W"..." around what was converted, nothing around what was not
+    always      // W"..." and "..."
+};
+bool AddText(Line& line, const void* text, size_t length, bool utf16, Quotes quotes = Quotes::converted);
 
 // How large the area for the UTF-16 form of an argument is.
 enum class TextArea {

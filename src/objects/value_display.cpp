@@ -31,7 +31,7 @@ void EndLine(Line& line) {
 // --- Texts and bytes -----------------------------------------------------------------------------------------------
 
 void ShowText(Line& line, std::string_view text, bool utf16) {
-    if (AddQuotedText(line, text.data(), text.size(), utf16)) EndLine(line);
+    if (AddText(line, text.data(), text.size(), utf16, Quotes::always)) EndLine(line);
 }
 
 void ShowBytes(Line& line, std::string_view bytes) {

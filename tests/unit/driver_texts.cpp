@@ -98,7 +98,7 @@ TEST_F(Texts, ConvertFromUtf16) {
     EXPECT_EQ(Printed([&] { EXPECT_FALSE(convertFromUTF16("a", 2, output)); }), "convertFromUTF16 failed: rc = 1\n");
     Line line;
     line.Text("before ");
-    EXPECT_EQ(Printed([&] { EXPECT_FALSE(AddQuotedText(line, "a", 2, true)); }),
+    EXPECT_EQ(Printed([&] { EXPECT_FALSE(AddText(line, "a", 2, true, Quotes::always)); }),
               "before convertFromUTF16 failed: rc = 1\n");
 }
 
