@@ -14,9 +14,8 @@ namespace {
 
 // Every record of the handle, from the first on.
 void PrintRecords(void* handle, ub4 type) {
-    char text[kDiagnosticSize];
     for (ub4 number = 1;; ++number) {
-        text[0] = text[1] = '\0';
+        char text[kDiagnosticSize] = {};  // a text of another width than expected ends where it ends, all the same
         sb4 code = 0;
         const sword rc = Call(&ClientLibrary::OCIErrorGet, handle, number, nullptr, &code,
                               reinterpret_cast<OraText*>(text), ub4{kDiagnosticSize}, type);
