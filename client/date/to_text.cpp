@@ -167,8 +167,10 @@ private:
         filled_ = filled;
     }
 
+    // Of years a model may ask for the last digits; the hundredth century has three and keeps them.
     void PutNumber(const Element& element) {
-        const int number = LastDigits(NumberOf(element.field, value_), element.width);
+        int number = NumberOf(element.field, value_);
+        if (element.field != Field::century) number = LastDigits(number, element.width);
         if (element.has_sign) PutSign();
         if (!element.spelled) {
             writer_.PutDigits(static_cast<unsigned>(number), filled_ ? element.width : 1);

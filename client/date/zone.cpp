@@ -178,8 +178,10 @@ Errno SetRegion(std::string_view name, DateTime* value) {
 }  // namespace
 
 Errno SetOffset(bool west, int hours, int minutes, DateTime* value) noexcept {
-    if (hours > 14 || (west && hours * 60 + minutes > 12 * 60 && minutes < 60)) return kBadZoneHour;
+    const int furthest = west ? 12 : 14;
+    if (hours > furthest) return kBadZoneHour;
     if (minutes > 59) return kBadZoneMinute;
+    if (hours == furthest && minutes > 0) return kBadZoneHour;
     SetOffset((west ? -1 : 1) * (hours * 60 + minutes), 0, value);
     return 0;
 }

@@ -97,8 +97,9 @@ sword OCIDateAddMonths(OCIError* err, const OCIDate* given, sb4 months, OCIDate*
                     [months](const auto& value, auto* result) { return date::AddMonths(value, months, result); });
 }
 
+// A copy, of dates that do not exist as well.
 sword OCIDateAssign(OCIError* err, const OCIDate* from, OCIDate* to) {
-    return MakeDate(err, from, to, [](const auto& value, auto* result) { return date::AddDays(value, 0, result); });
+    return MakeDate(err, from, to, [](const auto& value, auto* result) { return *result = value, 0; });
 }
 
 sword OCIDateLastDay(OCIError* err, const OCIDate* given, OCIDate* out) {

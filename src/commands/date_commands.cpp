@@ -24,8 +24,10 @@ constexpr DateAndInt kDateAndInt[] = {
 
 using TwoDates = ValueOperation<int, const OCIDate*, const OCIDate*>;
 constexpr TwoDates kTwoDates[] = {
-    {{286, WordsBetween(4, 5), "OCIDateCompare hError date1 date2 [result]"}, &ClientLibrary::OCIDateCompare},
-    {{287, WordsBetween(4, 5), "OCIDateDaysBetween hError date1 date2 [result]"}, &ClientLibrary::OCIDateDaysBetween},
+    {{286, WordsBetween(4, 5), "OCIDateCompare hError date1 date2 [result]"}, &ClientLibrary::OCIDateCompare,
+     Outcome::printed},
+    {{287, WordsBetween(4, 5), "OCIDateDaysBetween hError date1 date2 [result]"}, &ClientLibrary::OCIDateDaysBetween,
+     Outcome::printed},
 };
 
 using DateTest = ValueOperation<uword, const OCIDate*>;
@@ -68,7 +70,7 @@ void RunSysDate(int count, char** words) {
     const sword rc = Call(&ClientLibrary::OCIDateSysDate, error, result.Pointer());
     TraceAndReport(kSysDate, error, rc);
     const bool wanted = count > 2 && std::strcmp(words[count - 1], "-print") == 0;
-    if (rc == OCI_SUCCESS && wanted && result.Pointer() != nullptr) PrintDate(result.Value());
+    if (rc == OCI_SUCCESS && wanted) PrintDate(result.Value());
 }
 
 // An area that a text of at most `size` bytes fits in. A size below 0, which the library takes for a huge one, gets an

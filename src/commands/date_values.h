@@ -25,6 +25,7 @@ using DateOperand = Operand<const OCIDate*>;
 
 template <> struct ResultForm<OCIDate> {
     static constexpr bool kStored = true;
+    static constexpr bool kPrintedAnyway = true;
     static constexpr OCIDate kInitial = {};
     static void Print(const OCIDate& date, OCIError*) { PrintDate(date); }
     static void Store(const char* word, const OCIDate& date) { StoreDate(word, date); }
@@ -33,6 +34,7 @@ template <> struct ResultForm<OCIDate> {
 // The only unsigned results are check flags.
 template <> struct ResultForm<uword> {
     static constexpr bool kStored = false;
+    static constexpr bool kPrintedAnyway = true;
     static constexpr uword kInitial = 0;
     static void Print(uword flags, OCIError*) { PrintDateCheckFlags(flags); }
 };

@@ -36,10 +36,11 @@ void RunCompare(int count, char** words) {
     const Handles handles(words);
     OCIDateTime* const left = FindDateTime(words[3]);
     OCIDateTime* const right = FindDateTime(words[4]);
-    ResultPlace<int> result(count, words, 5);
+    int order = 0;
     const sword rc = Call(&ClientLibrary::OCIDateTimeCompareNS, handles.environment, handles.error, left, right,
-                          result.Pointer());
-    Conclude(kCompare, handles.error, rc, result);
+                          Place(order, count, words, 5));
+    TraceAndReport(kCompare, handles.error, rc);
+    if (rc == OCI_SUCCESS) Message(kOutput, "%d\n", order);
 }
 
 void RunConstruct(int, char** words) {

@@ -55,6 +55,8 @@ void RunFile(const FileCommand& row, int, char** words) {
     if (rc == OCI_SUCCESS && row.frees_name) Release(Kind::file, words[3]);
 }
 
+// Words that are none of their table's reach the library as what stands for "not found": for the type, that is how a
+// plain file is asked for.
 void RunOpen(int, char** words) {
     const char* const name = words[3];
     const Handles handles(words);
@@ -62,9 +64,9 @@ void RunOpen(int, char** words) {
     TextArgument file_name;
     TextArgument path;
     if (!SetClosedText(file_name, words[4]) || !SetClosedText(path, words[5])) return;
-    const ub4 mode = static_cast<ub4>(DecodeKeywordOrNumber(words[6], FileOpenModeKeywords));
-    const ub4 create = static_cast<ub4>(DecodeKeywordOrNumber(words[7], FileCreateKeywords));
-    const ub4 type = static_cast<ub4>(DecodeKeywordOrNumber(words[8], FileStdKeywords));
+    const ub4 mode = static_cast<ub4>(DecodeKeyword(words[6], FileOpenModeKeywords));
+    const ub4 create = static_cast<ub4>(DecodeKeyword(words[7], FileCreateKeywords));
+    const ub4 type = static_cast<ub4>(DecodeKeyword(words[8], FileStdKeywords));
     OCIFileObject* file = nullptr;
     OCIFileObject** const place = NewPlace(file, name);
     const sword rc = Call(&ClientLibrary::OCIFileOpen, handles.environment, handles.error, place, file_name.Text(),

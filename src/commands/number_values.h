@@ -36,6 +36,7 @@ using NumberOperand = Operand<const OCINumber*>;
 
 template <> struct ResultForm<OCINumber> {
     static constexpr bool kStored = true;
+    static constexpr bool kPrintedAnyway = false;
     static constexpr OCINumber kInitial = kZeroNumber;
     static void Print(const OCINumber& value, OCIError* error) { PrintNumber(value, error); }
     static void Store(const char* word, const OCINumber& value) { StoreNumberResult(word, value); }

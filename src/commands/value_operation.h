@@ -45,9 +45,11 @@ private:
 };
 
 // What a result of type T starts as, how it is printed, and how it is stored under a word (kStored: whether it is).
+// kPrintedAnyway: a success prints the local value even where the library was given no place to write to.
 template <class T> struct ResultForm;
 template <> struct ResultForm<int> {
     static constexpr bool kStored = false;
+    static constexpr bool kPrintedAnyway = false;
     static constexpr int kInitial = 0;
     static void Print(int value, OCIError*) { Message(kOutput, "%d\n", value); }
 };
@@ -64,10 +66,9 @@ public:
 
     // After a call that succeeded.
     void PrintAndStore(OCIError* error) {
-        if (refused_) return;
-        ResultForm<T>::Print(value_, error);
+        if (!refused_ || ResultForm<T>::kPrintedAnyway) ResultForm<T>::Print(value_, error);
         if constexpr (ResultForm<T>::kStored)
-            if (word_ != nullptr) ResultForm<T>::Store(word_, value_);
+            if (word_ != nullptr && !refused_) ResultForm<T>::Store(word_, value_);
     }
 
 private:

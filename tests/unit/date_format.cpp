@@ -46,6 +46,7 @@ TEST(DateToText, EachElement) {
         {"2000-02-09", "CC SCC Q", "20  20 1"},
         {"2001-12-09", "CC FMSCC Q", "21 21 4"},
         {"-0001-12-09", "SCC", "-01"},
+        {"9901-12-09", "CC CCTH FMYYY", "100 100TH 901"},
         {"2024-02-09", "MM MON Mon mon RM|", "02 FEB Feb feb II  |"},
         {"2024-05-09", "MONTH|Month|month|fmMonth|", "MAY      |May      |may      |May|"},
         {"2024-09-04", "DAY Day day fmDay DY Dy dy D", "WEDNESDAY Wednesday wednesday Wednesday WED Wed wed 4"},
