@@ -102,9 +102,14 @@ Errno ToInteger(const OCINumber& value, std::size_t length, bool is_signed, void
 Errno FromFloat(float value, OCINumber* result) noexcept;
 Errno FromDouble(double value, OCINumber* result) noexcept;
 Errno FromLongDouble(long double value, OCINumber* result) noexcept;
+// The same, rounded to the digits that a double keeps of every number: 0.1 + 0.2 is 0.3.
+constexpr int kRealDigits = 15;
+Errno FromReal15(double value, OCINumber* result) noexcept;
 Errno ToFloat(const OCINumber& value, float* result) noexcept;
 Errno ToDouble(const OCINumber& value, double* result) noexcept;
 Errno ToLongDouble(const OCINumber& value, long double* result) noexcept;
+// By the decimal digits of the float: 0.1f is 0.1, not 0.100000001490116.
+double WidenByDigits(float value) noexcept;
 
 // Plain text: the shortest exact text, "-.5", "1200", "1.5E-60". No zero stands before the point; the exponent form is
 // taken when the fixed form needs more than 40 places.

@@ -14,11 +14,12 @@ namespace {
 
 constexpr std::size_t kMaxText = 64;
 
-template <class Real> Errno FromReal(Real value, OCINumber* result) {
+// With the digits that tell it from other reals, or with so many places after the first digit.
+template <class Real, class... Places> Errno FromReal(Real value, OCINumber* result, Places... places) {
     if (std::isnan(value)) return kBadNumber;
     if (std::isinf(value)) return kOverflow;
     char text[kMaxText];
-    const auto end = std::to_chars(text, text + sizeof text, value, std::chars_format::scientific).ptr;
+    const auto end = std::to_chars(text, text + sizeof text, value, std::chars_format::scientific, places...).ptr;
     Errno error;
     if (!ReadPlain({text, static_cast<std::size_t>(end - text)}, '.', result, &error)) return kBadNumber;
     return error;
@@ -64,8 +65,17 @@ template <class Real> Errno ToReal(const OCINumber& value, Real* result) {
 Errno FromFloat(float value, OCINumber* result) noexcept { return FromReal(value, result); }
 Errno FromDouble(double value, OCINumber* result) noexcept { return FromReal(value, result); }
 Errno FromLongDouble(long double value, OCINumber* result) noexcept { return FromReal(value, result); }
+Errno FromReal15(double value, OCINumber* result) noexcept { return FromReal(value, result, kRealDigits - 1); }
 Errno ToFloat(const OCINumber& value, float* result) noexcept { return ToReal(value, result); }
 Errno ToDouble(const OCINumber& value, double* result) noexcept { return ToReal(value, result); }
 Errno ToLongDouble(const OCINumber& value, long double* result) noexcept { return ToReal(value, result); }
+
+double WidenByDigits(float value) noexcept {
+    char text[kMaxText];
+    const auto end = std::to_chars(text, text + sizeof text, value).ptr;
+    double widened = value;
+    std::from_chars(text, end, widened);
+    return widened;
+}
 
 }  // namespace number

@@ -39,7 +39,7 @@ constexpr int kTruncationWarning = 24345;
 constexpr int kBadCharacters = 24365;       // text that cannot be converted to or from UTF-16
 
 // What a select-list column holds, as far as its values convert in their own way.
-enum class ColumnClass : std::uint8_t { plain, number, date, timestamp, timestamp_zone };
+enum class ColumnClass : std::uint8_t { plain, number, binary_float, date, timestamp, timestamp_zone };
 ColumnClass ClassOf(std::uint16_t internal_type);
 
 // Settings of one bind or define, and the room in which its values are put together.
@@ -76,11 +76,13 @@ using InConverter = int (*)(const Source& source, Workspace& workspace, engine::
 // A whole value in the form that is handed out in pieces.
 using Renderer = int (*)(const engine::Datum& datum, Workspace& workspace, std::string_view& whole);
 
-// What stands behind a Datum: its kind, or a number that arrives as text.
+// What stands behind a Datum: its kind, a number that arrives as text, or a real of a binary column. Other reals stand
+// for numbers.
 constexpr std::size_t kKinds = static_cast<std::size_t>(engine::Kind::cursor) + 1;
 constexpr std::size_t kNumberText = kKinds;
+constexpr std::size_t kBinaryReal = kKinds + 1;
 template <class Function>
-using ByOrigin = std::array<Function, kKinds + 1>;
+using ByOrigin = std::array<Function, kKinds + 2>;
 // By the kind of Datum, for one column.
 template <class Function>
 using ByKind = std::array<Function, kKinds>;
@@ -109,9 +111,19 @@ template <class Function>
 ByKind<Function> ForColumn(const ByOrigin<Function>& row, ColumnClass column) {
     ByKind<Function> functions;
     for (std::size_t kind = 0; kind < kKinds; ++kind) functions[kind] = row[kind];
-    const auto text = static_cast<std::size_t>(engine::Kind::text);
-    if (column == ColumnClass::number) functions[text] = row[kNumberText];
-    else if (column != ColumnClass::plain) functions[text] = row[static_cast<std::size_t>(engine::Kind::timestamp)];
+    const auto set = [&](engine::Kind kind, std::size_t origin) {
+        functions[static_cast<std::size_t>(kind)] = row[origin];
+    };
+    switch (column) {
+        case ColumnClass::plain: break;
+        case ColumnClass::number: set(engine::Kind::text, kNumberText); break;
+        case ColumnClass::binary_float: set(engine::Kind::real, kBinaryReal); break;
+        case ColumnClass::date:
+        case ColumnClass::timestamp:
+        case ColumnClass::timestamp_zone:
+            set(engine::Kind::text, static_cast<std::size_t>(engine::Kind::timestamp));
+            break;
+    }
     return functions;
 }
 

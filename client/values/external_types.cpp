@@ -75,6 +75,8 @@ ColumnClass ClassOf(std::uint16_t internal_type) {
         case SQLT_VNU:
         case SQLT_BFLOAT:
         case SQLT_BDOUBLE: return ColumnClass::number;
+        case SQLT_IBFLOAT:
+        case SQLT_IBDOUBLE: return ColumnClass::binary_float;
         case SQLT_DAT:
         case SQLT_DATE: return ColumnClass::date;
         case SQLT_TIMESTAMP:

@@ -168,7 +168,7 @@ int FromFlt(const Source& source, Workspace&, Datum& datum) {
     }
     float narrow;
     std::memcpy(&narrow, source.at, sizeof narrow);
-    datum.real = narrow;
+    datum.real = number::WidenByDigits(narrow);
     return 0;
 }
 int FromNum(const Source& source, Workspace& workspace, Datum& datum) {

@@ -71,7 +71,8 @@ void SetRowId(const rowid::RowId& value, Datum& datum) {
 template <auto put>
 constexpr ByOrigin<OutConverter> kRowIdRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<rowid::RowId, RowIdOfText, put>, NoConversion,
-    NoConversion, NoConversion, Through<rowid::RowId, RowIdOfDatum, put>, NoConversion, NoConversion};
+    NoConversion, NoConversion, Through<rowid::RowId, RowIdOfDatum, put>, NoConversion, NoConversion,
+    NoConversion};
 
 }  // namespace
 

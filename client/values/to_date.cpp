@@ -32,7 +32,7 @@ int PutOdt(const date::DateTime& value, Workspace&, Target& target) {
 template <auto put>
 constexpr ByOrigin<OutConverter> kDateRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<date::DateTime, DateOfText, put>, NoConversion,
-    Through<date::DateTime, DateOfText, put>, NoConversion, NoConversion, NoConversion, NoConversion};
+    Through<date::DateTime, DateOfText, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
 
 }  // namespace
 

@@ -29,6 +29,9 @@ int NumberOfInteger(const Datum& datum, Workspace&, OCINumber& number) {
     return 0;
 }
 int NumberOfReal(const Datum& datum, Workspace&, OCINumber& number) {
+    return AsConversionError(number::FromReal15(datum.real, &number));
+}
+int NumberOfBinaryReal(const Datum& datum, Workspace&, OCINumber& number) {
     return AsConversionError(number::FromDouble(datum.real, &number));
 }
 int OwnNumber(const Datum& datum, Workspace&, OCINumber& number) {
@@ -93,7 +96,7 @@ int UintOfInteger(const Datum& datum, Workspace&, std::uint64_t& value) {
 }
 // The fraction is cut. The upper limit is the power of two above, which a double holds exactly.
 template <class Integer>
-int IntegerOfReal(const Datum& datum, Workspace&, Integer& value) {
+int IntegerOfBinaryReal(const Datum& datum, Workspace&, Integer& value) {
     const double whole = std::trunc(datum.real);
     constexpr double kEnd = std::numeric_limits<Integer>::digits == 64 ? 18446744073709551616.0 : 9223372036854775808.0;
     if (!(whole >= static_cast<double>(std::numeric_limits<Integer>::min()) && whole < kEnd)) return kIntegerOverflow;
@@ -107,6 +110,13 @@ int IntegerOfNumber(const Datum& datum, Workspace& workspace, Integer& value) {
     OCINumber number;
     if (const int error = render(datum, workspace, number)) return error;
     return ToInteger(number, value) != 0 ? kIntegerOverflow : 0;
+}
+
+// What is a whole number but for the engine's binary arithmetic, is one: 4.35 * 100 is 435.
+template <class Integer>
+int IntegerOfReal(const Datum& datum, Workspace& workspace, Integer& value) {
+    if (std::trunc(datum.real) == datum.real) return IntegerOfBinaryReal(datum, workspace, value);
+    return IntegerOfNumber<Integer, NumberOfReal>(datum, workspace, value);
 }
 
 int RealOfInteger(const Datum& datum, Workspace&, double& value) {
@@ -131,15 +141,20 @@ int PutFlt(double value, Workspace&, Target& target) {
     return PutBytes(&narrow, sizeof narrow, target);
 }
 
-template <class Form, auto put, auto integer, auto real, auto decimal, auto text>
+template <class Form, auto put, auto integer, auto real, auto decimal, auto text, auto binary_real>
 constexpr ByOrigin<OutConverter> kRow = {
     NoConversion, Through<Form, integer, put>, Through<Form, real, put>, Through<Form, decimal, put>,
     Through<Form, text, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion,
-    Through<Form, text, put>};
+    Through<Form, text, put>, Through<Form, binary_real, put>};
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kNumberRow =
-    kRow<OCINumber, put, NumberOfInteger, NumberOfReal, OwnNumber, NumberOfText>;
+    kRow<OCINumber, put, NumberOfInteger, NumberOfReal, OwnNumber, NumberOfText, NumberOfBinaryReal>;
+
+template <class Integer, auto put, auto integer>
+constexpr ByOrigin<OutConverter> kIntegerRow =
+    kRow<Integer, put, integer, IntegerOfReal<Integer>, IntegerOfNumber<Integer, OwnNumber>,
+         IntegerOfNumber<Integer, NumberOfText>, IntegerOfBinaryReal<Integer>>;
 
 }  // namespace
 
@@ -147,13 +162,9 @@ const ByOrigin<OutConverter> kToNum = kNumberRow<PutNum>;
 const ByOrigin<OutConverter> kToPdn = kNumberRow<PutPdn>;
 const ByOrigin<OutConverter> kToDecimal64 = kNumberRow<PutDecimal<number::kDecimal64Size>>;
 const ByOrigin<OutConverter> kToDecimal128 = kNumberRow<PutDecimal<number::kDecimal128Size>>;
-const ByOrigin<OutConverter> kToInt =
-    kRow<std::int64_t, PutInt, IntOfInteger, IntegerOfReal<std::int64_t>, IntegerOfNumber<std::int64_t, OwnNumber>,
-         IntegerOfNumber<std::int64_t, NumberOfText>>;
-const ByOrigin<OutConverter> kToUin =
-    kRow<std::uint64_t, PutUin, UintOfInteger, IntegerOfReal<std::uint64_t>, IntegerOfNumber<std::uint64_t, OwnNumber>,
-         IntegerOfNumber<std::uint64_t, NumberOfText>>;
+const ByOrigin<OutConverter> kToInt = kIntegerRow<std::int64_t, PutInt, IntOfInteger>;
+const ByOrigin<OutConverter> kToUin = kIntegerRow<std::uint64_t, PutUin, UintOfInteger>;
 const ByOrigin<OutConverter> kToFlt =
-    kRow<double, PutFlt, RealOfInteger, OwnReal, RealOfNumber<OwnNumber>, RealOfNumber<NumberOfText>>;
+    kRow<double, PutFlt, RealOfInteger, OwnReal, RealOfNumber<OwnNumber>, RealOfNumber<NumberOfText>, OwnReal>;
 
 }  // namespace values

@@ -36,8 +36,9 @@ int NumberText(const OCINumber& number, Workspace& workspace, View& text) {
     return 0;
 }
 
-// Infinities and what is no number have names; reals of usual size are written directly, in the plain form of numbers.
-int RealText(const Datum& datum, Workspace& workspace, View& text) {
+// With all digits that tell it from other reals. Infinities and what is no number have names; reals of usual size are
+// written directly, in the plain form of numbers.
+int BinaryRealText(const Datum& datum, Workspace& workspace, View& text) {
     const double value = datum.real;
     if (std::isnan(value)) return text = "Nan", 0;
     if (std::isinf(value)) return text = value > 0 ? "Inf" : "-Inf", 0;
@@ -56,6 +57,21 @@ int RealText(const Datum& datum, Workspace& workspace, View& text) {
     }
     text = value == 0 ? View("0") : View(begin, static_cast<std::size_t>(end - begin));
     return 0;
+}
+
+// Digits from the first that is not 0.
+std::ptrdiff_t SignificantDigits(View text) {
+    text.remove_prefix(std::min(text.find_first_of("123456789"), text.size()));
+    return std::count_if(text.begin(), text.end(), [](char c) { return c >= '0' && c <= '9'; });
+}
+
+// As a number that the engine has computed, or keeps, as a real.
+int RealText(const Datum& datum, Workspace& workspace, View& text) {
+    if (const int error = BinaryRealText(datum, workspace, text)) return error;
+    if (SignificantDigits(text) <= number::kRealDigits) return 0;
+    OCINumber number;
+    if (const int error = number::FromReal15(datum.real, &number)) return error;
+    return NumberText(number, workspace, text);
 }
 
 int DecimalText(const Datum& datum, Workspace& workspace, View& text) {
@@ -261,12 +277,12 @@ constexpr ByOrigin<OutConverter> kTextRow = {
     NoConversion,                    Through<View, IntegerText, put>, Through<View, RealText, put>,
     Through<View, DecimalText, put>, Through<View, OwnText, put>,     Through<View, HexText, put>,
     Through<View, DateText, put>,    NoConversion,                    Through<View, RowIdText, put>,
-    NoConversion,                    Through<View, NumericText, put>};
+    NoConversion,                    Through<View, NumericText, put>, Through<View, BinaryRealText, put>};
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kBytesRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<View, BytesOfHex, put>, Through<View, OwnText, put>,
-    NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
+    NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
 
 }  // namespace
 
@@ -290,8 +306,8 @@ const ByOrigin<OutConverter> kToVbi = kBytesRow<PutVbi>;
 const ByOrigin<OutConverter> kToRaw = kBytesRow<PutRaw>;
 
 const ByOrigin<Renderer> kWholeText = {NoText, IntegerText, RealText, DecimalText, OwnText, HexText,
-                                       DateText, NoText, RowIdText, NoText, NumericText};
+                                       DateText, NoText, RowIdText, NoText, NumericText, BinaryRealText};
 const ByOrigin<Renderer> kWholeBytes = {NoText, NoText, NoText, NoText, BytesOfHex, OwnText,
-                                        NoText, NoText, NoText, NoText, NoText};
+                                        NoText, NoText, NoText, NoText, NoText, NoText};
 
 }  // namespace values

@@ -101,7 +101,7 @@ TEST_F(Conversions, NumbersAsText) {
         {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"},
         {"1e39", "1000000000000000000000000000000000000000"},
         {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"}, {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf"},
-        {"-9e999", "-Inf"},
+        {"-9e999", "-Inf"}, {"0.1 + 0.2", ".3"}, {"4.35 * 100", "435"}, {"1 / 3.0", ".333333333333333"},
         {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"},
     };
     for (const auto& c : cases)
@@ -116,7 +116,7 @@ TEST_F(Conversions, Integers) {
         {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0}, {"9.3e18", SQLT_INT, 8, 0, 1455},
         {"-9.3e18", SQLT_INT, 8, 0, 1455},
         {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0}, {"-2.99", SQLT_INT, 4, -2, 0},
-        {"' 17 '", SQLT_INT, 4, 17, 0},
+        {"' 17 '", SQLT_INT, 4, 17, 0}, {"4.35 * 100", SQLT_INT, 4, 435, 0}, {"9.95 * 100", SQLT_UIN, 2, 995, 0},
         {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722},
         {"x'01'", SQLT_INT, 4, 0, 932},
         {"255", SQLT_UIN, 1, 255, 0}, {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455},
@@ -142,6 +142,8 @@ TEST_F(Conversions, OtherNumbers) {
     EXPECT_EQ(Out("0.1", SQLT_FLT, 4), Raw(0.1f));
     EXPECT_EQ(Out("1e39", SQLT_FLT, 4), "!1426");
     EXPECT_EQ(Out("3", SQLT_IBDOUBLE, 8), Raw(3.0));
+    EXPECT_EQ(Out("0.1 + 0.2", SQLT_FLT, 8), Raw(0.1 + 0.2)) << "as the engine has it";
+    EXPECT_EQ(Out("0.1 + 0.2", SQLT_NUM, 22), Out("'0.3'", SQLT_NUM, 22));
     for (const ub2 type : {SQLT_NUM, SQLT_VNU}) {
         EXPECT_EQ(Hex(Out("123.45", type, 22).substr(0, 5)), "04C202182E") << type;
         EXPECT_EQ(Hex(Out("'-1'", type, 22).substr(0, 4)), "033E6466") << type;
@@ -158,6 +160,20 @@ TEST_F(Conversions, OtherNumbers) {
         EXPECT_EQ(In(wide, SQLT_BDOUBLE, "cast(cast(:1 as decfloat(34)) as varchar(100))"), number);
         EXPECT_EQ(In(narrow, SQLT_BFLOAT, "cast(cast(:1 as decfloat(34)) as varchar(100))"), number);
     }
+}
+
+TEST_F(Conversions, BinaryColumnsKeepTheirReals) {
+    MustRun("create table r(f binary_float, d binary_double, n number)");
+    MustRun("insert into r values(0.1, 0.1 + 0.2, 0.1 + 0.2)");
+    MustRun("insert into r values(16777217, 123456789012345678901, '1.5')");
+    const struct { const char* column; const char* first; const char* last; } columns[] = {
+        {"f", ".1", "16777216"}, {"d", ".30000000000000004", "123456789012345680000"}, {"n", ".3", "1.5"}};
+    for (const auto& c : columns) {
+        EXPECT_EQ(One(std::string("select ") + c.column + " from r where rowid = 1"), c.first) << c.column;
+        EXPECT_EQ(One(std::string("select ") + c.column + " from r where rowid = 2"), c.last) << c.column;
+    }
+    EXPECT_EQ(Run("insert into r(f) values(1e39)"), 1426);
+    EXPECT_EQ(Run("insert into r(d) values('one')"), 1722);
 }
 
 TEST_F(Conversions, PackedDecimalWithScale) {
@@ -254,7 +270,7 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {bytes("\1\0\0\0abc", 7), SQLT_LVC, -1, "'a'"}, {bytes("\377\377\377\377abc", 7), SQLT_LVC, -1, "!1458"},
         {"abc", SQLT_BIN, -1, "X'616263'"}, {"abc", SQLT_LBI, 1, "X'61'"}, {bytes("\1\0abc", 5), SQLT_VBI, -1, "X'61'"},
         {Raw<sb1>(-5), SQLT_INT, -1, "-5"}, {Raw<sb8>(INT64_MIN), SQLT_INT, -1, "-9223372036854775808"},
-        {Raw<ub1>(200), SQLT_UIN, -1, "200"}, {Raw(1.5f), SQLT_FLT, -1, "1.5"}, {Raw(-0.25), SQLT_FLT, -1, "-0.25"},
+        {Raw<ub1>(200), SQLT_UIN, -1, "200"}, {Raw(0.1f), SQLT_FLT, -1, "0.1"}, {Raw(-0.25), SQLT_FLT, -1, "-0.25"},
         {bytes("\x12\x34\x5D", 3), SQLT_PDN, -1, "-12345"}, {bytes("\x12\x34\x55", 3), SQLT_PDN, -1, "!1413"},
         {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"},
         {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"},

@@ -96,6 +96,7 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
 
 // Without limits nothing is refused for its size.
 Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)), purpose_(purpose) {
+    if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) column_.scale = kFloating;
     if (purpose == Purpose::store) return;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) column_.type = SQLT_NUM;
     if (IsDateType(column_.type)) return;
@@ -124,8 +125,8 @@ bool Coercion::Concerns(const Column& column) {
 
 Status Coercion::Apply(Datum& value) {
     if (value.kind == Kind::null) return {};
-    const bool is_binary_float = column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE;
-    if (is_binary_float || IsNumberType(column_.type)) return ApplyNumber(value);
+    if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) return ApplyBinary(value);
+    if (IsNumberType(column_.type)) return ApplyNumber(value);
     if (IsDateType(column_.type)) return ApplyDate(value);
     if (column_.type == SQLT_BIN) return ApplyBytes(value);
     return ApplyText(value);
@@ -165,8 +166,25 @@ Status Coercion::ApplyDigits(Datum& value) {
     }
     if (column_.type == SQLT_NUM && !(std::fabs(value.real) < kLargestNumber)) return Refuse(kNumericOverflow);
     if (!limited || IsPlainReal(value.real, precision, scale)) return {};
-    const int failure = number::FromDouble(value.real, &number_);
+    const int failure = number::FromReal15(value.real, &number_);
     return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
+}
+
+// A real of the column's width, whatever came as a number.
+Status Coercion::ApplyBinary(Datum& value) {
+    if (Status status = ApplyNumber(value); status.Failed() || value.kind == Kind::null) return status;
+    if (value.kind == Kind::integer) {
+        value.real = static_cast<double>(value.integer);
+    } else if (value.kind == Kind::decimal) {
+        const int failure = number::ToDouble(*static_cast<const OCINumber*>(value.data), &value.real);
+        if (failure != 0) return Refuse(kNumericOverflow);
+    }
+    value.kind = Kind::real;
+    if (column_.type == SQLT_IBDOUBLE) return {};
+    const auto narrow = static_cast<float>(value.real);
+    if (std::isinf(narrow) && !std::isinf(value.real)) return Refuse(kNumericOverflow);
+    value.real = number::WidenByDigits(narrow);
+    return {};
 }
 
 Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {

@@ -27,6 +27,7 @@ public:
 
 private:
     Status ApplyNumber(Datum& value);
+    Status ApplyBinary(Datum& value);
     Status ApplyDigits(Datum& value);
     Status ApplyDecimal(const OCINumber& number, Datum& value);
     Status ApplyText(Datum& value);

@@ -46,7 +46,7 @@ void SetBytes(Datum& datum, Kind kind, std::string_view bytes) {
 int ReadNumber(sqlite3_value* value, OCINumber& number) {
     switch (sqlite3_value_type(value)) {
         case SQLITE_INTEGER: number::FromInt64(sqlite3_value_int64(value), &number); return 0;
-        case SQLITE_FLOAT: return number::FromDouble(sqlite3_value_double(value), &number);
+        case SQLITE_FLOAT: return number::FromReal15(sqlite3_value_double(value), &number);
         case SQLITE_BLOB: return ReadNumberBlob(Bytes(value), number) ? 0 : number::kInvalidNumber;
         default: return number::FromPlainText(TextOf(value), '.', &number);
     }

@@ -9,7 +9,6 @@ namespace engine::sqlite {
 namespace {
 
 constexpr unsigned char kMark[4] = {0x00, 'N', 0xC0, 0x80};
-constexpr int kRealDigits = 15;
 
 // Significant decimal digits of a well-formed number that is not zero.
 int SignificantDigits(const OCINumber& number) {
@@ -32,7 +31,7 @@ StoredNumber StoredNumber::From(const OCINumber& number) {
     int whole = 0;
     if (number::IsInt(number, &whole) == 0 && whole && number::ToInt64(number, &stored.integer) == 0) {
         stored.form = Form::integer;
-    } else if (SignificantDigits(number) <= kRealDigits && number::ToDouble(number, &stored.real) == 0) {
+    } else if (SignificantDigits(number) <= number::kRealDigits && number::ToDouble(number, &stored.real) == 0) {
         stored.form = Form::real;
     } else {
         stored.form = Form::blob;
