@@ -14,7 +14,7 @@ sword EnterAttribute(const void* object, ub4 type, OCIError* errhp, Body&& body)
     Object* target = Live<Object>(object);
     if (static_cast<const Object*>(error) != target) error->list.Clear();
     if (!target || target->Type() != type) return OCI_INVALID_HANDLE;
-    const SerialLock lock(target->Serial());
+    const SerialLock lock(*target);
     return Guard(error->list, [&] { return body(*target); });
 }
 

@@ -140,7 +140,7 @@ Object* Freeable(std::span<const Maker> makers, const void* pointer, TypeCode ty
 }
 
 sword Free(Object& object) noexcept {
-    const SerialLock lock(object.Serial());
+    const SerialLock lock(object);
     if (object.InUse()) return EnterEnvironment(&object.Env(), [](Environment&) { return Error(kHandleInUse); });
     Destroy(&object);
     return OCI_SUCCESS;

@@ -81,7 +81,7 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
     auto* service = Live<ServiceContext>(*out);
     const bool is_new = !service;
     if (is_new) service = Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0);
-    const SerialLock lock(service->Serial());
+    const SerialLock lock(*service);
     try {
         status = service->LogOn(database, credentials);
     } catch (...) {

@@ -2,6 +2,7 @@
 #include "handles/error_handle.h"
 
 #include <cstdio>
+#include <utility>
 
 #include "handles/attributes.h"
 #include "handles/gate.h"
@@ -33,20 +34,32 @@ std::string ErrorMessage(int number, std::string_view engine, std::string_view d
 
 void ErrorList::Add(const Status& status) {
     if (status.Number() == 0) return;
+    int none = kNone;
+    if (status.Plain() && state_.compare_exchange_strong(none, status.Number(), std::memory_order_relaxed)) return;
+    List(status);
+}
+
+void ErrorList::List(const Status& status) {
     const std::lock_guard lock(mutex_);
+    records_.reserve(records_.size() + 2);
+    const int alone = state_.exchange(kListed, std::memory_order_relaxed);
+    if (alone > 0) records_.push_back({alone, Status::kClient, {}});
     records_.push_back({status.Number(), status.Engine(), status.Detail()});
-    any_.store(true, std::memory_order_relaxed);
 }
 
 void ErrorList::TakeFrom(ErrorList& other) noexcept {
+    const int state = other.state_.exchange(kNone, std::memory_order_relaxed);
+    Clear();
+    if (state != kListed) return state_.store(state, std::memory_order_relaxed);
     const std::scoped_lock lock(mutex_, other.mutex_);
-    records_ = std::move(other.records_);
-    other.records_.clear();
-    other.any_.store(false, std::memory_order_relaxed);
-    any_.store(!records_.empty(), std::memory_order_relaxed);
+    records_ = std::exchange(other.records_, {});
+    state_.store(kListed, std::memory_order_relaxed);
 }
 
 std::optional<ErrorList::Record> ErrorList::At(std::size_t position) const {
+    const int state = state_.load(std::memory_order_relaxed);
+    if (state > 0 && position == 1) return Record{state, Status::kClient, {}};
+    if (state != kListed) return std::nullopt;
     const std::lock_guard lock(mutex_);
     if (position == 0 || position > records_.size()) return std::nullopt;
     return records_[position - 1];
@@ -55,7 +68,7 @@ std::optional<ErrorList::Record> ErrorList::At(std::size_t position) const {
 void ErrorList::Empty() noexcept {
     const std::lock_guard lock(mutex_);
     records_.clear();
-    any_.store(false, std::memory_order_relaxed);
+    state_.store(kNone, std::memory_order_relaxed);
 }
 
 std::span<const AttributeRow> ErrorHandle::Attributes() const { return kRows; }

@@ -30,7 +30,9 @@ public:
     };
 
     void Clear() noexcept {
-        if (any_.load(std::memory_order_relaxed)) Empty();    // most calls find nothing and lock nothing
+        const int state = state_.load(std::memory_order_relaxed);
+        if (state == kListed) Empty();
+        else if (state != kNone) state_.store(kNone, std::memory_order_relaxed);
     }
     void Add(const Status& status);    // nothing for a status without a number; throws std::bad_alloc
     void TakeFrom(ErrorList& other) noexcept;
@@ -39,10 +41,14 @@ public:
 
 private:
     void Empty() noexcept;
+    void List(const Status& status);
 
+    // Most calls leave no record, and most that do leave a plain one: neither locks anything.
+    static constexpr int kNone = 0;
+    static constexpr int kListed = -1;
+    std::atomic<int> state_{kNone};    // or the number of the only record, a plain one
     mutable std::mutex mutex_;
-    std::atomic<bool> any_{false};
-    std::vector<Record> records_;
+    std::vector<Record> records_;    // when listed
 };
 
 class ErrorHandle : public Object {

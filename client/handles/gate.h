@@ -47,7 +47,7 @@ sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept 
     error->list.Clear();
     T* target = Live<T>(object);
     if (!target) return OCI_INVALID_HANDLE;
-    const SerialLock lock(target->Serial());
+    const SerialLock lock(*target);
     return Guard(error->list, [&] { return body(*target, *error); });
 }
 

@@ -17,29 +17,27 @@
 #include <mutex>
 #include <utility>
 
-#include "handles/object.h"
+#include "handles/environment.h"
+
+namespace in_flight {
+
+constinit std::atomic<Epoch> current_epoch{1};
+constinit std::atomic<bool> somebody_waits{false};
+[[gnu::tls_model("initial-exec")]] constinit thread_local Slot* own_slot = nullptr;
+
+static bool RegisterBarrier() {
+    return syscall(SYS_membarrier, MEMBARRIER_CMD_REGISTER_PRIVATE_EXPEDITED, 0, 0) == 0;
+}
+const bool system_barrier = RegisterBarrier();
+
+}  // namespace in_flight
 
 namespace {
 
-using Epoch = std::uint64_t;
-constexpr Epoch kOutside = 0;
+using namespace in_flight;
 
-// What a thread shows to the others. Never freed: a thread that ends leaves its slot to the next.
-struct alignas(64) Slot {
-    std::atomic<Epoch> entered{kOutside};
-    std::atomic<bool> taken{true};
-    unsigned depth = 0;    // the owner's: calls within calls
-    Slot* next = nullptr;
-};
-
-constinit std::atomic<Epoch> current_epoch{1};
 constinit std::atomic<Slot*> slots{nullptr};
 constinit std::atomic<unsigned> slots_taken{0};
-constinit std::atomic<bool> somebody_waits{false};    // retired objects do
-[[gnu::tls_model("initial-exec")]] constinit thread_local Slot* own_slot = nullptr;
-
-bool RegisterBarrier() { return syscall(SYS_membarrier, MEMBARRIER_CMD_REGISTER_PRIVATE_EXPEDITED, 0, 0) == 0; }
-const bool system_barrier = RegisterBarrier();
 
 // Orders what this thread did before against what every running thread does after.
 void BarrierForAll() {
@@ -77,15 +75,6 @@ pthread_key_t SlotKey() {
         return made;
     }();
     return key;
-}
-
-Slot* TakeSlot() {
-    Slot* slot = FreeSlot();
-    if (!slot) slot = NewSlot();
-    slots_taken.fetch_add(1, std::memory_order_relaxed);
-    std::atomic_thread_fence(std::memory_order_seq_cst);
-    pthread_setspecific(SlotKey(), slot);
-    return own_slot = slot;
 }
 
 // The oldest call that another thread is in; `limit` when none is older.
@@ -165,7 +154,7 @@ void RetiredObjects::DestroyRipe() noexcept {
         while (Object* object = TakeRipe()) {
             lock.unlock();
             {
-                const SerialLock serial(object->Serial());
+                const SerialLock serial(*object);
                 ObjectTree::DestroyTree(object);
             }
             lock.lock();
@@ -185,24 +174,20 @@ RetiredObjects& Retired() {
 
 }  // namespace
 
-CallInFlight::CallInFlight() noexcept {
-    Slot* slot = own_slot ? own_slot : TakeSlot();
-    if (slot->depth++ > 0) return;
-    slot->entered.store(current_epoch.load(std::memory_order_acquire), std::memory_order_release);
-    if (system_barrier) std::atomic_signal_fence(std::memory_order_seq_cst);
-    else std::atomic_thread_fence(std::memory_order_seq_cst);
-}
-
-CallInFlight::~CallInFlight() {
-    Slot* slot = own_slot;
-    if (--slot->depth > 0) return;
-    slot->entered.store(kOutside, std::memory_order_release);
-    if (!system_barrier) std::atomic_thread_fence(std::memory_order_seq_cst);
-    if (somebody_waits.load(std::memory_order_relaxed)) Retired().DestroyRipe();
-}
-
 namespace in_flight {
 
+Slot& TakeSlot() noexcept {
+    Slot* slot = FreeSlot();
+    if (!slot) slot = NewSlot();
+    slots_taken.fetch_add(1, std::memory_order_relaxed);
+    std::atomic_thread_fence(std::memory_order_seq_cst);
+    pthread_setspecific(SlotKey(), slot);
+    own_slot = slot;
+    return *slot;
+}
+
 bool MayDestroy(Object& object) noexcept { return Retired().Ripe(object); }
+
+void DestroyRipe() noexcept { Retired().DestroyRipe(); }
 
 }  // namespace in_flight

@@ -5,6 +5,7 @@
 // by Live, which asks the set of living objects and never reads the memory behind an unknown pointer.
 #pragma once
 
+#include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -84,6 +85,7 @@ private:
 // Held while a call on an object runs, which may destroy the object; nothing in environments without threads.
 class SerialLock {
 public:
+    explicit SerialLock(Object& object);
     explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) : mutex_(std::move(mutex)) {
         if (mutex_) mutex_->lock();
     }
@@ -113,9 +115,45 @@ private:
     static void DestroyTree(Object* object) noexcept;
 };
 
-// The set of living objects. Contains and KindOf are lock-free and read nothing but the set.
+// The set of living objects: a hash table from pointer to kind. KindOf takes no lock and reads nothing but the table; it
+// is inline, since every call of the library asks at least once.
 namespace live {
-Kind KindOf(const void* pointer) noexcept;    // Kind::none when it is no living object
+
+using Key = std::uintptr_t;
+constexpr Key kEmpty = 0;
+constexpr Key kErased = 1;    // no object lies there
+
+struct Slot {
+    std::atomic<Key> key{kEmpty};
+    std::atomic<Kind> kind{Kind::none};
+};
+
+struct Table {
+    unsigned shift;
+    std::size_t mask;
+    Slot* slots;
+
+    [[nodiscard]] std::size_t Home(Key key) const {
+        return static_cast<std::size_t>((key * std::uint64_t{0x9E3779B97F4A7C15}) >> shift);
+    }
+    [[nodiscard]] std::size_t Next(std::size_t index) const { return (index + 1) & mask; }
+    [[nodiscard]] std::size_t Previous(std::size_t index) const { return (index - 1) & mask; }
+};
+
+extern constinit std::atomic<const Table*> current;    // never null
+
+// Kind::none when it is no living object.
+inline Kind KindOf(const void* pointer) noexcept {
+    const Key key = reinterpret_cast<Key>(pointer);
+    if (key <= kErased) return Kind::none;
+    const Table& table = *current.load(std::memory_order_acquire);
+    for (std::size_t index = table.Home(key);; index = table.Next(index)) {
+        const Key found = table.slots[index].key.load(std::memory_order_acquire);
+        if (found == key) return table.slots[index].kind.load(std::memory_order_relaxed);
+        if (found == kEmpty) return Kind::none;
+    }
+}
+
 void Insert(const void* pointer, Kind kind);
 void Erase(const void* pointer) noexcept;
 void Retype(const void* pointer, Kind kind) noexcept;    // of a living object
