@@ -34,8 +34,9 @@ Status SystemError(const std::string& name, int error) {
 
 Status InvalidArgument(const char* what) { return Error(kInvalidFileArgument, what); }
 
-// By open mode; where appended data goes is the descriptor's care.
+// By open mode. A stream that appends must know, or it takes its position for another after it has written.
 constexpr const char* kStreamModes[] = {nullptr, "r", "w", "r+"};
+constexpr const char* kAppendingModes[] = {nullptr, "r", "a", "a+"};
 constexpr int kAccessModes[] = {0, O_RDONLY, O_WRONLY, O_RDWR};
 
 int OpenFlags(std::uint32_t mode, std::uint32_t create) {
@@ -80,7 +81,7 @@ Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t cre
         close(descriptor);
         return SystemError(name, EISDIR);
     }
-    std::FILE* stream = fdopen(descriptor, kStreamModes[mode]);
+    std::FILE* stream = fdopen(descriptor, create & OCI_FILE_APPEND ? kAppendingModes[mode] : kStreamModes[mode]);
     if (!stream) {
         const int error = errno;
         close(descriptor);
