@@ -147,7 +147,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
     if (Status status = Compile(0, compiled); !status.Ok()) return status;
     if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
     if (rows.HasTables()) return Error(kTablesInBlocksOnly);
-    described_ = true;
+    const bool was_described = std::exchange(described_, true);
     if (arguments.iterations > 0) {
         if (Status status = CheckRange(arguments); !status.Ok()) return status;
         if (Status status = ActivateDefines(); !status.Ok()) return status;
@@ -155,7 +155,10 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
     if (scanned_.steps[0].locks_rows || scanned_.steps[0].run == sql::Run::change) {
         if (Status status = Engine().Begin(); !status.Ok()) return status;
     }
-    if (Status status = compiled->query->Open(rows, 0); !status.Ok()) return status;
+    if (Status status = compiled->query->Open(rows, 0); !status.Ok()) {
+        described_ = was_described;
+        return status;
+    }
     cursor_.Open(*compiled->query, arguments.mode & OCI_STMT_SCROLLABLE_READONLY);
     ++UsedLink()->open_statements;
     defines_changed_ = true;    // the first row may have told more of the columns
