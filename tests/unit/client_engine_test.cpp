@@ -283,7 +283,7 @@ TEST_F(EngineTest, ColumnsAreDescribed) {
                                  {"I", SQLT_NUM, 22, 5, 0, true},
                                  {"1+1", SQLT_CHR, 0, 0, 0, true},
                                  {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true},
-                                 {"ID", SQLT_RDD, 18, 0, 0, false},
+                                 {"ROWID", SQLT_RDD, 18, 0, 0, false},
                                  {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
                                  {"COUNT(CAST(B AS DATE))", SQLT_CHR, 0, 0, 0, true}};
     const auto& columns = query->Columns();

@@ -92,6 +92,7 @@ bool IsNullable(sqlite3* database, sqlite3_stmt* statement, int index) {
 
 void DescribeItem(const SelectItem& item, Column& column, bool& typed) {
     if (item.is_row_id) {
+        if (!item.has_alias) column.name = "ROWID";    // SQLite names the key column that stands for it
         column.type = SQLT_RDD;
         column.size = kRowIdSize;
         column.precision = 0;

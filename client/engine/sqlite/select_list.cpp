@@ -42,10 +42,9 @@ std::string CastType(const std::vector<std::string_view>& pieces) {
 
 SelectItem ReadItem(std::string_view text) {
     std::vector<std::string_view> pieces = Split(text);
-    for (std::size_t index = 1; index + 1 < pieces.size(); ++index) {
-        if (index + 2 == pieces.size() && IsWord(pieces[index], "as")) pieces.resize(index);
-    }
     SelectItem item;
+    item.has_alias = pieces.size() > 2 && IsWord(pieces[pieces.size() - 2], "as");
+    if (item.has_alias) pieces.resize(pieces.size() - 2);
     item.is_row_id = !pieces.empty() && IsWord(pieces.back(), "rowid") &&
                      (pieces.size() == 1 || (pieces.size() == 3 && pieces[1] == "."));
     item.cast_type = CastType(pieces);

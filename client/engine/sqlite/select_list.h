@@ -9,6 +9,7 @@ namespace engine::sqlite {
 
 struct SelectItem {
     bool is_row_id = false;
+    bool has_alias = false;
     std::string cast_type;    // of an expression that is wholly a cast: its type
 };
 
