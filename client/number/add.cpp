@@ -14,7 +14,7 @@ bool DropsDigits(const Digits& digits, int count) {
 // |larger| + |smaller|, with the sign of the larger. Digits below the guard digits cannot change a rounding half up.
 Errno AddMagnitudes(Digits larger, Digits smaller, OCINumber* result) {
     ShiftRight(&smaller, larger.exponent - smaller.exponent);
-    if (AddInto(&larger, smaller)) PrependOne(&larger);
+    TakeCarry(&larger, AddInto(&larger, smaller));
     return RoundAndPack(&larger, result);
 }
 
@@ -42,14 +42,11 @@ template <bool kNegative>
     Digits a, b;
     if (!HasMantissa(left) || !HasMantissa(right)) return false;
     if (Decode<kNegative>(left.OCINumberPart, &a) | Decode<kNegative>(right.OCINumberPart, &b)) return false;
-    unsigned exponent = left.OCINumberPart[1];
-    if (AddInto(&a, b)) {
-        constexpr unsigned kLast = kNegative ? 0 : 255;
-        PrependOne(&a);
-        if (exponent == kLast || (a.words[2] & 0xFFFFFFFFu) != 0) return false;
-        exponent += kNegative ? -1u : 1u;
-    }
-    Encode<kNegative>(a, exponent, result);
+    const auto carry = static_cast<unsigned>(AddInto(&a, b));
+    constexpr std::uint64_t kTwentieth = 0xFFull << 32;
+    const bool is_full = a.exponent == kMaxExponent || (a.words[2] & kTwentieth) != 0;
+    if (is_full && carry) return false;
+    Encode<kNegative>(a, carry, result);
     return true;
 }
 
@@ -59,18 +56,17 @@ template <bool kNegative>
     Digits a, b;
     if (!HasMantissa(left) || !HasMantissa(right)) return false;
     if (Decode<kNegative>(left.OCINumberPart, &a) | Decode<kNegative>(right.OCINumberPart, &b)) return false;
-    const unsigned exponent = left.OCINumberPart[1];
     const bool below = SubtractFrom(&a, b);
     if (below) {
         b = a;
-        a = Digits{};
+        a = Digits{.exponent = b.exponent};
         SubtractFrom(&a, b);
     }
     if (a.words[0] >> 56 == 0) return false;
     if (below)
-        Encode<!kNegative>(a, exponent ^ 0xFF, result);
+        Encode<!kNegative>(a, 0, result);
     else
-        Encode<kNegative>(a, exponent, result);
+        Encode<kNegative>(a, 0, result);
     return true;
 }
 

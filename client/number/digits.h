@@ -183,13 +183,14 @@ inline void Normalize(Digits* digits) {
     digits->exponent -= moved;
 }
 
-// Sets a 1 in front of the digits: what a carry out of the first one leaves.
-[[gnu::always_inline]] inline void PrependOne(Digits* digits) {
+// Puts a carry out of the first digit, 0 or 1, in front of it; without a branch, since sums toss a coin.
+[[gnu::always_inline]] inline void TakeCarry(Digits* digits, std::uint64_t carry) {
     std::uint64_t* w = digits->words;
-    w[2] = w[2] >> 8 | w[1] << 56;
-    w[1] = w[1] >> 8 | w[0] << 56;
-    w[0] = w[0] >> 8 | 1ull << 56;
-    ++digits->exponent;
+    const std::uint64_t bits = carry * 8;
+    w[2] = w[2] >> bits | w[1] << 1 << (63 - bits);
+    w[1] = w[1] >> bits | w[0] << 1 << (63 - bits);
+    w[0] = w[0] >> bits | carry << 56;
+    digits->exponent += static_cast<int>(carry);
 }
 
 // Adds one unit of the digit at `index`; 99...9 becomes 1 with a higher exponent.
@@ -201,7 +202,7 @@ inline void Increment(Digits* digits, int index) {
         digits->words[i / 8] += unit.words[i / 8];
         return;
     }
-    if (AddInto(digits, unit)) PrependOne(digits);
+    TakeCarry(digits, AddInto(digits, unit));
 }
 
 // Moves the digits left by one if the first is 0 and the second is not; without a branch, since products toss a coin.
@@ -225,7 +226,7 @@ inline void RoundToMantissa(Digits* digits) {
     if (sum >= raised) return;
     Digits carried;
     carried.words[1] = 1;
-    if (AddInto(digits, carried)) PrependOne(digits);
+    TakeCarry(digits, AddInto(digits, carried));
 }
 
 // What is neither finite nor malformed: count 1 with exponent byte 0, or count 2 with the bytes 255 and 101.
@@ -264,19 +265,23 @@ template <bool kNegative>
     return ((w0 - (1ull << 56)) | (w0 + Repeat(28)) | w1 | (w1 + Repeat(28)) | w2 | (w2 + Repeat(28))) & kHighBits;
 }
 
-// Writes normalized digits, of which the last four are 0, as a number of that sign and exponent byte.
+// Writes normalized digits, of which the last four are 0, as a number of that sign; the exponent fits. A carry out of the
+// first digit, 0 or 1, goes in front of them, and the last of 20 digits leaves: the words are stored a byte further on,
+// each over the end of the one behind it.
 template <bool kNegative>
-[[gnu::always_inline]] inline void Encode(const Digits& digits, unsigned exponent, OCINumber* result) {
+[[gnu::always_inline]] inline void Encode(const Digits& digits, unsigned carry, OCINumber* result) {
     using namespace detail;
     std::uint8_t* bytes = result->OCINumberPart;
     const unsigned count = CountDigits(digits);
     const std::uint64_t* bias = kEncoding.rows[kNegative][count].words;
     const std::uint64_t* w = digits.words;
-    bytes[0] = static_cast<std::uint8_t>(count + 1 + (kNegative && count < kMantissaDigits));
-    bytes[1] = static_cast<std::uint8_t>(exponent);
-    Store(bytes + 2, kNegative ? bias[0] - w[0] : bias[0] + w[0]);
-    Store(bytes + 10, kNegative ? bias[1] - w[1] : bias[1] + w[1]);
-    Store(bytes + 18, static_cast<std::uint32_t>((kNegative ? bias[2] - w[2] : bias[2] + w[2]) >> 32));
+    const int exponent = digits.exponent + static_cast<int>(carry);
+    bytes[0] = static_cast<std::uint8_t>(count + carry + 1 + (kNegative && count + carry < kMantissaDigits));
+    bytes[1] = static_cast<std::uint8_t>(kNegative ? 62 - exponent : 193 + exponent);
+    bytes[2] = kNegative ? 100 : 2;
+    Store(bytes + 18, static_cast<std::uint32_t>((kNegative ? bias[2] - w[2] : bias[2] + w[2]) >> 32 >> carry * 8));
+    Store(bytes + 10 + carry, kNegative ? bias[1] - w[1] : bias[1] + w[1]);
+    Store(bytes + 2 + carry, kNegative ? bias[0] - w[0] : bias[0] + w[0]);
 }
 
 // kBadNumber for malformed bytes, kOverflow for an infinity.
@@ -298,9 +303,9 @@ inline Errno Pack(const Digits& digits, OCINumber* result) noexcept {
     if (digits.exponent > kMaxExponent) return kOverflow;
     if (digits.exponent < kMinExponent) return kUnderflow;
     if (digits.negative)
-        Encode<true>(digits, static_cast<unsigned>(62 - digits.exponent), result);
+        Encode<true>(digits, 0, result);
     else
-        Encode<false>(digits, static_cast<unsigned>(193 + digits.exponent), result);
+        Encode<false>(digits, 0, result);
     return 0;
 }
 
