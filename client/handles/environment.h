@@ -60,8 +60,9 @@ private:
     std::mutex tree_mutex_;    // links between this environment's objects
 };
 
-inline SerialLock::SerialLock(Object& object)
-    : SerialLock(object.Env().Threaded() ? object.Serial() : nullptr) {}
+inline SerialLock::SerialLock(Object& object) {
+    if (object.Env().Threaded()) Lock(object.Serial());
+}
 
 // Blocks the library holds in all environments.
 std::int64_t HeldBlocks() noexcept;

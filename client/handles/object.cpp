@@ -17,6 +17,11 @@ std::string& Object::KeptText(std::uint32_t attribute) {
     return kept_texts_.emplace_back(attribute, std::string()).second;
 }
 
+void SerialLock::Lock(std::shared_ptr<std::recursive_mutex> mutex) {
+    if (mutex) mutex->lock();
+    mutex_ = std::move(mutex);
+}
+
 void* ObjectTree::Reserve(Environment& environment, std::size_t size) { return environment.Allocate(size); }
 
 void ObjectTree::Unreserve(Environment& environment, void* memory) noexcept { environment.Release(memory); }

@@ -86,14 +86,14 @@ private:
 class SerialLock {
 public:
     explicit SerialLock(Object& object);
-    explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) : mutex_(std::move(mutex)) {
-        if (mutex_) mutex_->lock();
-    }
+    explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) { Lock(std::move(mutex)); }
     ~SerialLock() { if (mutex_) mutex_->unlock(); }
     SerialLock(const SerialLock&) = delete;
     SerialLock& operator=(const SerialLock&) = delete;
 
 private:
+    void Lock(std::shared_ptr<std::recursive_mutex> mutex);
+
     std::shared_ptr<std::recursive_mutex> mutex_;
 };
 

@@ -41,7 +41,8 @@ private:
     sword AskForPiece();
     bool ReceivePiece();
     bool ReceiveValue(ub4 column);
-    void AddValue(ub4 column);
+    void TakePiece();
+    void EndValue(ub4 column);
     bool PrintRow();
 
     OCIStmt* statement_;
@@ -55,7 +56,7 @@ private:
     Line line_;  // the row so far
 
     // The value under way, and the piece that the library is to deliver next.
-    std::string value_;
+    std::string value_;  // in UTF-16; any other goes into the line as it comes
     sword fetched_ = OCI_SUCCESS;  // what the last fetch answered
     void* define_ = nullptr;
     ub4 define_type_ = 0;
@@ -158,14 +159,19 @@ bool Table::ReceivePiece() {
     fetched_ = Fetch();
     if (!Check(fetched_, Failed(fetched_) && fetched_ != OCI_NEED_DATA && fetched_ != OCI_NO_DATA)) return false;
     length_ = std::min(length_, kPieceSize);
-    if (indicator_ == OCI_IND_NULL) return true;
-    value_.append(buffer_.get(), Utf16Mode ? Utf16Length(buffer_.get(), length_) : strnlen(buffer_.get(), length_));
+    if (indicator_ != OCI_IND_NULL) TakePiece();
     return true;
 }
 
-void Table::AddValue(ub4 column) {
+void Table::TakePiece() {
+    const char* const text = buffer_.get();
+    if (Utf16Mode) value_.append(text, Utf16Length(text, length_));
+    else line_.Text({text, strnlen(text, length_)});
+}
+
+void Table::EndValue(ub4 column) {
     if (indicator_ == OCI_IND_NULL) line_.Character('-');
-    else AddText(line_, value_.data(), value_.size(), Utf16Mode, Quotes::never);
+    else if (Utf16Mode) AddText(line_, value_.data(), value_.size(), Utf16Mode, Quotes::never);
     line_.Character(column < columns_ ? ',' : '\n');
 }
 
@@ -177,13 +183,13 @@ bool Table::ReceiveValue(ub4 column) {
         const void* const define = define_;
         if (!ReceivePiece()) return false;
         if (column == columns_ && fetched_ != OCI_NEED_DATA) {
-            AddValue(column);
+            EndValue(column);
             return true;
         }
         const sword rc = AskForPiece();
         const bool goes_on = define_ == define && (piece_ == OCI_NEXT_PIECE || piece_ == OCI_LAST_PIECE);
         if (goes_on && !Failed(rc) && length_ > 0) continue;
-        AddValue(column);
+        EndValue(column);
         return Check(rc, Failed(rc));
     }
 }
