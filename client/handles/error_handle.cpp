@@ -32,19 +32,14 @@ std::string ErrorMessage(int number, std::string_view engine, std::string_view d
     return message += '\n';
 }
 
-void ErrorList::Add(const Status& status) {
-    if (status.Number() == 0) return;
-    int none = kNone;
-    if (status.Plain() && state_.compare_exchange_strong(none, status.Number(), std::memory_order_relaxed)) return;
-    List(status);
-}
-
-void ErrorList::List(const Status& status) {
+void ErrorList::List(const Status& status) noexcept try {
     const std::lock_guard lock(mutex_);
     records_.reserve(records_.size() + 2);
     const int alone = state_.exchange(kListed, std::memory_order_relaxed);
     if (alone > 0) records_.push_back({alone, Status::kClient, {}});
     records_.push_back({status.Number(), status.Engine(), status.Detail()});
+} catch (const std::bad_alloc&) {
+    // The return code still tells of the failure.
 }
 
 void ErrorList::TakeFrom(ErrorList& other) noexcept {
@@ -72,12 +67,3 @@ void ErrorList::Empty() noexcept {
 }
 
 std::span<const AttributeRow> ErrorHandle::Attributes() const { return kRows; }
-
-sword Record(ErrorList& list, const Status& status) noexcept {
-    try {
-        list.Add(status);
-    } catch (const std::bad_alloc&) {
-        // The return code still tells of the failure.
-    }
-    return status.Code();
-}

@@ -34,14 +34,22 @@ public:
         if (state == kListed) Empty();
         else if (state != kNone) state_.store(kNone, std::memory_order_relaxed);
     }
-    void Add(const Status& status);    // nothing for a status without a number; throws std::bad_alloc
+    // Nothing for a status without a number. Without memory the record is lost.
+    void Add(const Status& status) noexcept {
+        if (status.Number() == 0) return;
+        if (status.Plain() && state_.load(std::memory_order_relaxed) == kNone) {
+            state_.store(status.Number(), std::memory_order_relaxed);
+        } else {
+            List(status);
+        }
+    }
     void TakeFrom(ErrorList& other) noexcept;
     // The record at a position, from 1; nothing beyond the last. A copy: throws std::bad_alloc.
     [[nodiscard]] std::optional<Record> At(std::size_t position) const;
 
 private:
     void Empty() noexcept;
-    void List(const Status& status);
+    void List(const Status& status) noexcept;
 
     // Most calls leave no record, and most that do leave a plain one: neither locks anything.
     static constexpr int kNone = 0;

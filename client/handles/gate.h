@@ -21,7 +21,10 @@ constexpr int kInternalError = 600;
 constexpr int kNullArgument = 21560;    // an argument is null or out of range
 
 // Adds the record of a status and answers its return code.
-sword Record(ErrorList& list, const Status& status) noexcept;
+inline sword Record(ErrorList& list, const Status& status) noexcept {
+    list.Add(status);
+    return status.Code();
+}
 
 // Runs a body and records into `list`.
 template <class Body>
