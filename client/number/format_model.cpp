@@ -171,4 +171,11 @@ Errno ParseFormat(std::string_view text, FormatModel* model) noexcept {
     return 0;
 }
 
+std::string_view SpellRoman(int value, char (&letters)[kRomanWidth]) {
+    std::size_t length = 0;
+    for (const RomanDigit& digit : kRomanDigits)
+        for (; value >= digit.value; value -= digit.value) length += digit.letters.copy(letters + length, 2);
+    return {letters, length};
+}
+
 }  // namespace number

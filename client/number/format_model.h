@@ -32,6 +32,9 @@ struct FormatModel {
 // kBadFormat for unknown or misplaced elements. The model keeps a view of the text.
 Errno ParseFormat(std::string_view text, FormatModel* model) noexcept;
 
+// Roman numerals: the largest, and how long they get.
+constexpr int kLargestRoman = 3999;
+constexpr int kRomanWidth = 15;
 struct RomanDigit {
     int value;
     std::string_view letters;
@@ -39,6 +42,8 @@ struct RomanDigit {
 constexpr RomanDigit kRomanDigits[] = {{1000, "M"}, {900, "CM"}, {500, "D"}, {400, "CD"}, {100, "C"},
                                        {90, "XC"},  {50, "L"},   {40, "XL"}, {10, "X"},   {9, "IX"},
                                        {5, "V"},    {4, "IV"},   {1, "I"}};
+// The one spelling of 1 to kLargestRoman, in capitals.
+std::string_view SpellRoman(int value, char (&letters)[kRomanWidth]);
 
 // The elements in the whole part that something is printed for.
 inline bool IsPlace(char element) { return element == '9' || element == '0'; }

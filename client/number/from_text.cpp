@@ -1,4 +1,6 @@
 // Text to numbers by a model.
+#include <algorithm>
+
 #include "number/decimal.h"
 #include "number/format.h"
 #include "number/format_model.h"
@@ -156,22 +158,19 @@ Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber
     return 0;
 }
 
-// Only the shortest spelling of a value is one.
+// Reads what it can digit by digit; the letters must then be those that the value is spelled with.
 Errno ReadRoman(std::string_view text, OCINumber* result) {
     text = WithoutLeadingBlanks(text);
+    if (text.empty() || text.size() > kRomanWidth) return kBadText;
+    char upper[kRomanWidth];
+    std::transform(text.begin(), text.end(), upper, Upper);
+    const std::string_view capitals(upper, text.size());
+    std::string_view rest = capitals;
     int value = 0;
-    for (const RomanDigit& digit : kRomanDigits) {
-        const bool once =
-            digit.letters.size() == 2 || digit.letters[0] == 'D' || digit.letters[0] == 'L' || digit.letters[0] == 'V';
-        for (int times = 0; times < (once ? 1 : 3); ++times) {
-            if (text.size() < digit.letters.size()) break;
-            if (Upper(text[0]) != digit.letters[0]) break;
-            if (digit.letters.size() == 2 && Upper(text[1]) != digit.letters[1]) break;
-            value += digit.value;
-            text.remove_prefix(digit.letters.size());
-        }
-    }
-    if (value == 0 || !text.empty()) return kBadText;
+    for (const RomanDigit& digit : kRomanDigits)
+        for (; rest.starts_with(digit.letters); rest.remove_prefix(digit.letters.size())) value += digit.value;
+    char letters[kRomanWidth];
+    if (!rest.empty() || value > kLargestRoman || SpellRoman(value, letters) != capitals) return kBadText;
     FromInt64(value, result);
     return 0;
 }

@@ -8,8 +8,7 @@ namespace number {
 
 namespace {
 
-constexpr int kMostFixedPlaces = 63;  // of TM; with the point 64 characters
-constexpr int kRomanWidth = 15;
+constexpr int kMostFixedCharacters = 64;  // of TM
 
 // What one conversion works on. `decimal` is rounded to the places of the model.
 struct Job {
@@ -241,25 +240,24 @@ Errno PutRoman(const OCINumber& value, const FormatModel& model, Writer* out) {
     OCINumber rounded;
     std::int64_t number = 0;
     if (const Errno error = Round(value, 0, &rounded)) return error;
-    const bool held = ToInt64(rounded, &number) == 0 && number >= 1 && number <= 3999;
+    const bool held = ToInt64(rounded, &number) == 0 && number >= 1 && number <= kLargestRoman;
     if (!held) {
         out->Repeat('#', kRomanWidth);
         return 0;
     }
     PutFilled(model.fill, kRomanWidth, out, [&](Writer* writer) {
-        std::int64_t rest = number;
-        for (const RomanDigit& digit : kRomanDigits)
-            for (; rest >= digit.value; rest -= digit.value)
-                for (const char letter : digit.letters)
-                    writer->Put(model.lower_case ? static_cast<char>(letter - 'A' + 'a') : letter);
+        char letters[kRomanWidth];
+        for (const char letter : SpellRoman(static_cast<int>(number), letters))
+            writer->Put(model.lower_case ? static_cast<char>(letter - 'A' + 'a') : letter);
     });
     return 0;
 }
 
 void PutShortest(const OCINumber& value, const FormatModel& model, const Nls& nls, Writer* out) {
     const Decimal decimal = DecimalOf(value);
-    const bool scientific = model.kind == FormatModel::Kind::shortest_scientific ||
-                            FixedPlaces(decimal) + decimal.negative > kMostFixedPlaces;
+    const int characters = FixedPlaces(decimal) + decimal.negative + (decimal.count > decimal.point);
+    const bool scientific =
+        model.kind == FormatModel::Kind::shortest_scientific || characters > kMostFixedCharacters;
     if (decimal.negative) out->Put('-');
     if (scientific)
         PutScientific(decimal, nls.decimal, out);
