@@ -80,6 +80,7 @@ struct Dialect {
     std::span<const Spelling> functions;     // replaced as whole words in expressions
     std::span<const Spelling> casts;         // type, function: "cast(e as T(a, b))" becomes "F(e, a, b)"
     bool has_dual = false;                   // whether "from dual" is understood as it stands
+    bool has_minus = false;                  // whether "minus select" is; "except" where it is not
     bool has_for_update = false;             // whether "for update" is; cut off where it is not
     bool has_date_literals = false;          // whether date '...' and timestamp '...' are; plain texts where not
 };

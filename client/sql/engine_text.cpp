@@ -108,6 +108,8 @@ private:
         if (token.Is("dual") && Previous(index).Is("from") && !dialect_.has_dual) {
             const bool named = FollowedByAlias(index);
             Replace(token, token.End(), named ? "(select 'X' as dummy)" : "(select 'X' as dummy) as dual");
+        } else if (token.Is("minus") && At(tokens_, index + 1).Is("select") && !dialect_.has_minus) {
+            Replace(token, token.End(), "except");
         } else if (token.Is("for") && step_.locks_rows && !dialect_.has_for_update && open_.empty() &&
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);

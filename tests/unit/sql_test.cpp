@@ -160,6 +160,8 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"select sysdate, t.sysdate, sysdate(1), 'sysdate' as sysdate",
          "select (now()), t.sysdate, sysdate(1), 'sysdate' as sysdate"},
         {"select 1 from dual", "select 1 from (select 'X' as dummy) as dual"},
+        {"select 1 minus select 2", "select 1 except select 2"},
+        {"select minus from t", "select minus from t"},
         {"select d.dummy from DUAL d where 1=1", "select d.dummy from (select 'X' as dummy) d where 1=1"},
         {"create table t(number number(10,2), raw long raw, v varchar2(20 char), x number(*,3))",
          "create table t(number numeric(10,2), raw blob, v varchar(20 ), x numeric(38,3))"},

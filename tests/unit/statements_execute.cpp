@@ -59,6 +59,29 @@ TEST_F(Executing, SyntaxErrorsPointIntoTheText) {
     EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
 }
 
+TEST_F(Executing, TheMomentInDefaultsAndLists) {
+    MustRun("create table t(a number, d date default sysdate, s timestamp default systimestamp)");
+    MustRun("insert into t(a) values(1)");
+    EXPECT_EQ(One("select count(*) from t where d <= sysdate and s is not null"), "1");
+    EXPECT_EQ(One("select nvl(null, nvl2(a, 'there', 'null')) from t"), "there");
+    ASSERT_EQ(Prepare("select sysdate, systimestamp from dual"), 0);
+    ASSERT_EQ(Execute(0, OCI_DESCRIBE_ONLY), 0);
+    const struct { ub4 position; const char* name; ub2 type; } columns[] = {
+        {1, "SYSDATE", SQLT_DAT}, {2, "SYSTIMESTAMP", SQLT_TIMESTAMP_TZ}};
+    for (const auto& c : columns) {
+        OCIParam* column = nullptr;
+        ASSERT_EQ(OCIParamGet(stmt, OCI_HTYPE_STMT, err, reinterpret_cast<void**>(&column), c.position), OCI_SUCCESS);
+        OraText* name = nullptr;
+        ub4 length = 0;
+        ub2 type = 0;
+        OCIAttrGet(column, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, err);
+        OCIAttrGet(column, OCI_DTYPE_PARAM, &type, nullptr, OCI_ATTR_DATA_TYPE, err);
+        EXPECT_EQ(std::string(reinterpret_cast<char*>(name), length), c.name);
+        EXPECT_EQ(type, c.type) << c.name;
+        OCIDescriptorFree(column, OCI_DTYPE_PARAM);
+    }
+}
+
 TEST_F(Executing, ParseOnlyRunsNothingAndComesFirst) {
     MustRun("create table t(a number)");
     ASSERT_EQ(Prepare("insert into t values(1)"), 0);

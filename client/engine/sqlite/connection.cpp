@@ -34,13 +34,6 @@ constexpr Dialect::Spelling kTypes[] = {
     {"timestamp with local time zone", "timestamp_ltz"},
     {"timestamp with time zone", "timestamp_tz"},
 };
-constexpr Dialect::Spelling kFunctions[] = {
-    {"sysdate", "kelp_sysdate()"},
-    {"current_date", "kelp_sysdate()"},
-    {"systimestamp", "kelp_systimestamp()"},
-    {"current_timestamp", "kelp_systimestamp()"},
-    {"localtimestamp", "kelp_systimestamp()"},
-};
 
 }  // namespace
 
@@ -155,7 +148,7 @@ std::string SqliteConnection::ServerVersion() {
 }
 
 const Dialect& SqliteConnection::GetDialect() const {
-    static constexpr Dialect kDialect{'?', kTypes, kFunctions, kCasts, false, false, false};
+    static constexpr Dialect kDialect{'?', kTypes, kMoments, kCasts, false, false, false};
     return kDialect;
 }
 

@@ -62,10 +62,20 @@ std::string AsWritten(std::string_view text) {
     return std::string(text);
 }
 
+// sysdate and its like as the application wrote them.
+std::string WithMoments(std::string name) {
+    for (const Dialect::Spelling& moment : kMoments) {
+        for (std::size_t at; (at = name.find(moment.engine)) != std::string::npos;)
+            name.replace(at, moment.engine.size(), moment.written);
+    }
+    return name;
+}
+
 // Names that were not quoted are shown in upper case. A name that stands quoted in the statement was.
 std::string ShownName(std::string_view name, std::string_view sql) {
     if (sql.find('"' + std::string(name) + '"') != std::string_view::npos) return std::string(name);
-    std::string shown = name.find("kelp_") == std::string_view::npos ? std::string(name) : AsWritten(name);
+    std::string shown = name.find("kelp_") == std::string_view::npos ? std::string(name)
+                                                                     : WithMoments(AsWritten(name));
     char quote = '\0';
     for (char& c : shown) {
         if (quote != '\0') {

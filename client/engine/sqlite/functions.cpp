@@ -1,4 +1,4 @@
-// The SQL functions. Arguments that are null make a null.
+// The SQL functions. Arguments that are null make a null, but for nvl and nvl2.
 #include "engine/sqlite/functions.h"
 
 #include <algorithm>
@@ -203,6 +203,18 @@ void Now(sqlite3_context* context, int, Arguments) {
     ReturnDate(context, now);
 }
 
+// nvl(x, instead)
+void Nvl(sqlite3_context* context, int, Arguments arguments) {
+    const bool null = sqlite3_value_type(arguments[0]) == SQLITE_NULL;
+    sqlite3_result_value(context, arguments[null ? 1 : 0]);
+}
+
+// nvl2(x, when it is there, when it is null)
+void Nvl2(sqlite3_context* context, int, Arguments arguments) {
+    const bool null = sqlite3_value_type(arguments[0]) == SQLITE_NULL;
+    sqlite3_result_value(context, arguments[null ? 2 : 1]);
+}
+
 // store(x, 'declared type', 'column'): what a column of that type takes, or refuses; compare(x, ...): what x is when it
 // is compared with one. The type is read once a statement.
 template <Coercion::Purpose purpose>
@@ -243,6 +255,8 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
     {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::store>},
     {"kelp_compare", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::compare>},
+    {"nvl", 2, 2, SQLITE_DETERMINISTIC, Nvl},
+    {"nvl2", 3, 3, SQLITE_DETERMINISTIC, Nvl2},
     {"kelp_sysdate", 0, 0, 0, Now<true>},
     {"kelp_systimestamp", 0, 0, 0, Now<false>},
 };

@@ -27,6 +27,15 @@ inline constexpr Dialect::Spelling kCasts[] = {
     {"timestamp", "kelp_timestamp"},
 };
 
+// The words for the present moment; in parentheses, as a column's default needs its expression.
+inline constexpr Dialect::Spelling kMoments[] = {
+    {"sysdate", "(kelp_sysdate())"},
+    {"current_date", "(kelp_sysdate())"},
+    {"systimestamp", "(kelp_systimestamp())"},
+    {"current_timestamp", "(kelp_systimestamp())"},
+    {"localtimestamp", "(kelp_systimestamp())"},
+};
+
 Status AddFunctions(sqlite3* database);
 
 }  // namespace engine::sqlite

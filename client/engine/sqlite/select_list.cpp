@@ -20,6 +20,13 @@ bool ClosesLast(const std::vector<std::string_view>& pieces, std::size_t open) {
     return false;
 }
 
+// The type of sysdate and its like, whose engine text is (F()).
+std::string_view MomentType(const std::vector<std::string_view>& pieces) {
+    if (pieces.size() != 5 || pieces[0] != "(") return {};
+    if (IsWord(pieces[1], "kelp_sysdate")) return "date";
+    return IsWord(pieces[1], "kelp_systimestamp") ? "timestamp_tz" : "";
+}
+
 // cast(e as T(a, b)), or F(e, a, b) of a function that casts.
 std::string CastType(const std::vector<std::string_view>& pieces) {
     if (pieces.size() < 4 || pieces[1] != "(" || !ClosesLast(pieces, 1)) return {};
@@ -47,7 +54,8 @@ SelectItem ReadItem(std::string_view text) {
     if (item.has_alias) pieces.resize(pieces.size() - 2);
     item.is_row_id = !pieces.empty() && IsWord(pieces.back(), "rowid") &&
                      (pieces.size() == 1 || (pieces.size() == 3 && pieces[1] == "."));
-    item.cast_type = CastType(pieces);
+    item.cast_type = MomentType(pieces);
+    if (item.cast_type.empty()) item.cast_type = CastType(pieces);
     return item;
 }
 
