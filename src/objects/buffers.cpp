@@ -92,7 +92,7 @@ uint32_t ElementSize(int type, uint32_t given, uint32_t precision) {
         case SQLT_VNU: return 22;
         case SQLT_INT: return given == 1 || given == 2 || given == 4 || given == 8 ? given : 4;
         case SQLT_FLT: return given == 4 || given == 8 || given == 16 ? given : 8;
-        case SQLT_PDN: return precision / 2 + 1;
+        case SQLT_PDN: return static_cast<uint32_t>(PackedDecimalSize(precision));
         case SQLT_VCS:
         case SQLT_VBI:
         case SQLT_AVC: return given + 2;

@@ -8,6 +8,7 @@
 
 #include "core/keywords.h"
 #include "core/messages.h"
+#include "oci.h"
 
 namespace {
 
@@ -195,29 +196,29 @@ void Release(Kind kind, const char* name) {
 
 std::optional<Kind> KindOfHandleType(int type) {
     switch (type) {
-        case 1: return Kind::environment;
-        case 2: return Kind::error;
-        case 3: return Kind::svc;
-        case 4: return Kind::stmt;
-        case 5: return Kind::bind;
-        case 6: return Kind::define;
-        case 7: return Kind::describe;
-        case 8: return Kind::server;
-        case 9: return Kind::session;
-        case 10: return Kind::trans;
-        case 26: return Kind::cpool;
-        case 27: return Kind::spool;
+        case OCI_HTYPE_ENV: return Kind::environment;
+        case OCI_HTYPE_ERROR: return Kind::error;
+        case OCI_HTYPE_SVCCTX: return Kind::svc;
+        case OCI_HTYPE_STMT: return Kind::stmt;
+        case OCI_HTYPE_BIND: return Kind::bind;
+        case OCI_HTYPE_DEFINE: return Kind::define;
+        case OCI_HTYPE_DESCRIBE: return Kind::describe;
+        case OCI_HTYPE_SERVER: return Kind::server;
+        case OCI_HTYPE_SESSION: return Kind::session;
+        case OCI_HTYPE_TRANS: return Kind::trans;
+        case OCI_HTYPE_CPOOL: return Kind::cpool;
+        case OCI_HTYPE_SPOOL: return Kind::spool;
         default: return std::nullopt;
     }
 }
 
 std::optional<Kind> KindOfDescriptorType(int type) {
     switch (type) {
-        case 50: return Kind::lob;
-        case 52: return Kind::result;
-        case 54: return Kind::rowid;
-        case 56: return Kind::file;
-        case 62: return Kind::datetime;
+        case OCI_DTYPE_LOB: return Kind::lob;
+        case OCI_DTYPE_RSET: return Kind::result;
+        case OCI_DTYPE_ROWID: return Kind::rowid;
+        case OCI_DTYPE_FILE: return Kind::file;
+        case 62: return Kind::datetime;  // what the keyword oci_dtype_datetime stands for
         default: return std::nullopt;
     }
 }
