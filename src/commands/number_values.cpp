@@ -1,3 +1,4 @@
+// Numbers between words, buffers and the log.
 #include "commands/number_values.h"
 
 #include <algorithm>

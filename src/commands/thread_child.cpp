@@ -1,3 +1,4 @@
+// The routines that run in threads of a script.
 #include "commands/thread_child.h"
 
 #include <atomic>
