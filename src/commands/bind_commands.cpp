@@ -45,7 +45,7 @@ struct Bind : CommandRow {
 };
 
 bool ReadName(Placeholder& placeholder, char** words) {
-    return placeholder.name.Set(words[4], DecodeLong(words[5]), TextArea::four_times_and_one);
+    return placeholder.name.SetWords(words + 4, TextArea::four_times_and_one);
 }
 
 bool ReadPosition(Placeholder& placeholder, char** words) {
@@ -118,10 +118,8 @@ constexpr Bind kBinds[] = {
 
 // --- Defines ---------------------------------------------------------------------------------------------------------
 
-constexpr int kDefineCode = 321;
-
 // A name that is taken hands its define over, and keeps it.
-void DefineByPosition(int, char** words) {
+void DefineByPosition(const CommandRow& row, int, char** words) {
     const NamedObject* const held = FindByName(Kind::define, words[2]);
     NewObject<OCIDefine> object(words[2]);
     if (held != nullptr) object.Hand(static_cast<OCIDefine*>(held->object));
@@ -134,13 +132,13 @@ void DefineByPosition(int, char** words) {
     const sword rc = Call(&ClientLibrary::OCIDefineByPos, statement, object.Place(), error, static_cast<ub4>(position),
                           target.value, static_cast<sb4>(target.size), target.type, target.indicator, target.length,
                           target.return_code, mode);
-    TraceAndReport(kDefineCode, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
     if (rc != OCI_SUCCESS || held != nullptr || object.Place() == nullptr) return;
     EnterOnStatement(object, Kind::define, statement, words);
 }
 
 constexpr PlainCommand kDefines[] = {
-    {{kDefineCode, Words(7), "OCIDefineByPos Stmt hDefine hError pos {memhandle | memstructhandle} mode"},
+    {{321, Words(7), "OCIDefineByPos Stmt hDefine hError pos {memhandle | memstructhandle} mode"},
      DefineByPosition},
 };
 

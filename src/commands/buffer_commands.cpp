@@ -63,7 +63,7 @@ int AllocateNamed(const char* name, const Request& request) {
                           request.precision, request.scale);
 }
 
-void GetBuffer(int, char** words) {
+void GetBuffer(const CommandRow&, int, char** words) {
     const char* name = words[2];
     Request request{};
     if (!ResolveStatement(words[1], request.statement)) return;
@@ -77,7 +77,7 @@ void GetBuffer(int, char** words) {
     if (rc == 0) Message(kOutput, "GetMemOCI: memory buffer %s allocated.\n", name);
 }
 
-void FreeBuffer(int, char** words) {
+void FreeBuffer(const CommandRow&, int, char** words) {
     MemBuffer* buffer = FindBuffer(words[1]);
     if (buffer == nullptr) return;
     buffer->in_use = false;
@@ -87,7 +87,7 @@ void FreeBuffer(int, char** words) {
 
 // --- Changing ------------------------------------------------------------------------------------------------------
 
-void UpdateElement(int, char** words) {
+void UpdateElement(const CommandRow&, int, char** words) {
     MemBuffer* buffer = FindBuffer(words[1]);
     if (buffer == nullptr) return;
     const long index = DecodeLong(words[2]);
@@ -126,7 +126,7 @@ constexpr FieldUpdate kFieldUpdates[] = {
     {6, "Invalid value of prcode\n", [](MemBuffer& buffer, const char*) { buffer.call_return_codes = nullptr; }},
 };
 
-void UpdateField(int, char** words) {
+void UpdateField(const CommandRow&, int, char** words) {
     MemBuffer* buffer = FindBuffer(words[1]);
     if (buffer == nullptr) return;
     const int field = DecodeKeyword(words[2], BufferFieldKeywords);
@@ -140,7 +140,7 @@ void UpdateField(int, char** words) {
 
 // --- Listing -------------------------------------------------------------------------------------------------------
 
-void ListBuffers(int count, char** words) {
+void ListBuffers(const CommandRow&, int count, char** words) {
     void* statement = nullptr;
     if (!ResolveStatement(words[1], statement)) return;
     const char* name = count > 2 ? words[2] : nullptr;

@@ -50,7 +50,7 @@ void LogOn(OCIEnv* environment, OCIError* error, OCISvcCtx* svc, int count, char
     ReturnCodeReport(error, rc);
 }
 
-void QuickConnect(int count, char** words) {
+void QuickConnect(const CommandRow&, int count, char** words) {
     if (CheckInUse(Kind::environment, words[1]) || CheckInUse(Kind::error, words[2]) || CheckInUse(Kind::svc, words[3]))
         return;
     OCIEnv* const environment = MakeEnvironment(words[1]);
@@ -76,7 +76,7 @@ bool FreeHandle(OCIEnv* environment, void* handle, ub4 type, Kind kind, const ch
     return true;
 }
 
-void KillEnvironment(int, char** words) {
+void KillEnvironment(const CommandRow&, int, char** words) {
     void* found = InvalidObject();
     if (!IsInvalid(words[1]) && !FindObject(Kind::environment, words[1], found)) return;
     auto* const environment = static_cast<OCIEnv*>(found);

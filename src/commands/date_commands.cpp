@@ -35,9 +35,7 @@ constexpr DateTest kDateTests[] = {
     {{285, WordsBetween(3, 4), "OCIDateCheck hError date [valid]"}, &ClientLibrary::OCIDateCheck},
 };
 
-enum Code { kFromText = 288, kNextDay = 290, kSysDate = 291, kToText = 292 };
-
-void RunFromText(int count, char** words) {
+void RunFromText(const CommandRow& row, int count, char** words) {
     OCIError* const error = ResolveError<OCIError>(words[1]);
     TextArgument date;
     TextArgument format;
@@ -47,10 +45,10 @@ void RunFromText(int count, char** words) {
     ResultPlace<OCIDate> result(count, words, 8);
     const sword rc = Call(&ClientLibrary::OCIDateFromText, error, date.Text(), date.Length(), format.Text(),
                           static_cast<ub1>(format.Length()), language.Text(), language.Length(), result.Pointer());
-    Conclude(kFromText, error, rc, result);
+    Conclude(row.code, error, rc, result);
 }
 
-void RunNextDay(int count, char** words) {
+void RunNextDay(const CommandRow& row, int count, char** words) {
     ErrorWord error(words[1]);
     DateOperand date;
     if (!date.Resolve(words[2], error)) return;
@@ -60,15 +58,15 @@ void RunNextDay(int count, char** words) {
     ResultPlace<OCIDate> result(count, words, 5);
     const sword rc = Call(&ClientLibrary::OCIDateNextDay, handle, date.Argument(), day.Text(), day.Length(),
                           result.Pointer());
-    Conclude(kNextDay, handle, rc, result);
+    Conclude(row.code, handle, rc, result);
 }
 
 // Printed only when the last word asks for it; stored never.
-void RunSysDate(int count, char** words) {
+void RunSysDate(const CommandRow& row, int count, char** words) {
     OCIError* const error = ResolveError<OCIError>(words[1]);
     ResultPlace<OCIDate> result(count, words, 2);
     const sword rc = Call(&ClientLibrary::OCIDateSysDate, error, result.Pointer());
-    TraceAndReport(kSysDate, error, rc);
+    TraceAndReport(row.code, "", error, rc);
     const bool wanted = count > 2 && std::strcmp(words[count - 1], "-print") == 0;
     if (rc == OCI_SUCCESS && wanted) PrintDate(result.Value());
 }
@@ -96,7 +94,7 @@ private:
     size_t size_ = 0;
 };
 
-void RunToText(int count, char** words) {
+void RunToText(const CommandRow& row, int count, char** words) {
     ErrorWord error(words[1]);
     DateOperand date;
     if (!date.Resolve(words[2], error)) return;
@@ -114,18 +112,18 @@ void RunToText(int count, char** words) {
     const sword rc = Call(&ClientLibrary::OCIDateToText, handle, date.Argument(), format.Text(),
                           static_cast<ub1>(format.Length()), language.Text(), language.Length(), length_place,
                           text_place);
-    TraceAndReport(kToText, handle, rc);
+    TraceAndReport(row.code, "", handle, rc);
     if (rc != OCI_SUCCESS) return;
     if (length_place != nullptr) Message(kOutput, "Length - %u\n", length);
     if (length_place != nullptr && text_place != nullptr) output.Print(length);
 }
 
 constexpr PlainCommand kDateConversions[] = {
-    {{kFromText, WordsBetween(8, 9), "OCIDateFromText hError date date_len fmt fmt_len lang lang_len [dateobj]"},
+    {{288, WordsBetween(8, 9), "OCIDateFromText hError date date_len fmt fmt_len lang lang_len [dateobj]"},
      RunFromText},
-    {{kNextDay, WordsBetween(5, 6), "OCIDateNextDay hError date dayname dayname_len [next_day]"}, RunNextDay},
-    {{kSysDate, WordsBetween(2, 4), "OCIDateSysDate hError [-print] [sys_date]"}, RunSysDate},
-    {{kToText, Words(8, 10), "OCIDateToText hError date format format_len lang lang_len maxlen [pcbText pText]"},
+    {{290, WordsBetween(5, 6), "OCIDateNextDay hError date dayname dayname_len [next_day]"}, RunNextDay},
+    {{291, WordsBetween(2, 4), "OCIDateSysDate hError [-print] [sys_date]"}, RunSysDate},
+    {{292, Words(8, 10), "OCIDateToText hError date format format_len lang lang_len maxlen [pcbText pText]"},
      RunToText},
 };
 

@@ -5,45 +5,40 @@
 
 namespace {
 
-enum Code {
-    kAssign = 293, kCheck = 294, kCompare = 295, kConstruct = 296, kGetDate = 331, kGetTime = 332, kSetDate = 333,
-    kSetTime = 334
-};
-
 OCIDateTime* FindDateTime(const char* word) {
     return Resolve<OCIDateTime>(Kind::datetime, word);
 }
 
-void RunAssign(int, char** words) {
+void RunAssign(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     OCIDateTime* const from = FindDateTime(words[3]);
     OCIDateTime* const to = FindDateTime(words[4]);
     const sword rc = Call(&ClientLibrary::OCIDateTimeAssignNS, handles.environment, handles.error, from, to);
-    TraceAndReport(kAssign, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc == OCI_SUCCESS) PrintDateTime(to);
 }
 
-void RunCheck(int count, char** words) {
+void RunCheck(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIDateTime* const datetime = FindDateTime(words[3]);
     ResultPlace<uword> flags(count, words, 4);
     const sword rc = Call(&ClientLibrary::OCIDateTimeCheckNS, handles.environment, handles.error, datetime,
                           flags.Pointer());
-    Conclude(kCheck, handles.error, rc, flags);
+    Conclude(row.code, handles.error, rc, flags);
 }
 
-void RunCompare(int count, char** words) {
+void RunCompare(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIDateTime* const left = FindDateTime(words[3]);
     OCIDateTime* const right = FindDateTime(words[4]);
     int order = 0;
     const sword rc = Call(&ClientLibrary::OCIDateTimeCompareNS, handles.environment, handles.error, left, right,
                           Place(order, count, words, 5));
-    TraceAndReport(kCompare, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc == OCI_SUCCESS) Message(kOutput, "%d\n", order);
 }
 
-void RunConstruct(int, char** words) {
+void RunConstruct(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     OCIDateTime* const datetime = FindDateTime(words[3]);
     TextArgument zone;
@@ -53,11 +48,11 @@ void RunConstruct(int, char** words) {
                           static_cast<ub1>(DecodeNumber(words[6])), static_cast<ub1>(DecodeNumber(words[7])),
                           static_cast<ub1>(DecodeNumber(words[8])), static_cast<ub1>(DecodeNumber(words[9])),
                           static_cast<ub4>(DecodeNumber(words[10])), zone.Text(), zone.Length());
-    TraceAndReport(kConstruct, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc == OCI_SUCCESS) PrintDateTime(datetime);
 }
 
-void RunGetDate(int count, char** words) {
+void RunGetDate(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIDateTime* const datetime = FindDateTime(words[3]);
     sb2 year = 0;
@@ -65,7 +60,7 @@ void RunGetDate(int count, char** words) {
     ub1 day = 0;
     const sword rc = Call(&ClientLibrary::OCIDateTimeGetDateNS, handles.environment, handles.error, datetime,
                           Place(year, count, words, 4), Place(month, count, words, 5), Place(day, count, words, 6));
-    TraceAndReport(kGetDate, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc == OCI_SUCCESS) Message(kOutput, "year-%d, month-%d, day-%d\n", year, month, day);
 }
 
@@ -76,37 +71,37 @@ struct TimeOfDay {
     ub4 fraction = 0;
 };
 
-void RunGetTime(int count, char** words) {
+void RunGetTime(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIDateTime* const datetime = FindDateTime(words[3]);
     TimeOfDay time;
     const sword rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, handles.environment, handles.error, datetime,
                           Place(time.hour, count, words, 4), Place(time.minute, count, words, 5),
                           Place(time.second, count, words, 6), Place(time.fraction, count, words, 7));
-    TraceAndReport(kGetTime, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc != OCI_SUCCESS) return;
     Message(kOutput, "hour-%d, minute-%d, second-%d, fraction-%d\n", time.hour, time.minute, time.second,
             static_cast<int>(time.fraction));
 }
 
-void RunSetDate(int, char** words) {
+void RunSetDate(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     OCIDateTime* const datetime = FindDateTime(words[3]);
     const sword rc = Call(&ClientLibrary::OCI_datetimeSetDate, handles.environment, handles.error, datetime,
                           static_cast<sb2>(DecodeNumber(words[4])), static_cast<ub1>(DecodeNumber(words[5])),
                           static_cast<ub1>(DecodeNumber(words[6])));
-    TraceAndReport(kSetDate, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc == OCI_SUCCESS) PrintDateTime(datetime);
 }
 
 // What was set is read back and printed, in a form that differs from that of getting in its blanks.
-void RunSetTime(int, char** words) {
+void RunSetTime(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     OCIDateTime* const datetime = FindDateTime(words[3]);
     sword rc = Call(&ClientLibrary::OCI_datetimeSetTime, handles.environment, handles.error, datetime,
                     static_cast<ub1>(DecodeNumber(words[4])), static_cast<ub1>(DecodeNumber(words[5])),
                     static_cast<ub1>(DecodeNumber(words[6])), static_cast<ub4>(DecodeNumber(words[7])));
-    TraceAndReport(kSetTime, handles.error, rc);
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc != OCI_SUCCESS) return;
     TimeOfDay time;
     rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, handles.environment, handles.error, datetime, &time.hour,
@@ -117,16 +112,16 @@ void RunSetTime(int, char** words) {
 }
 
 constexpr PlainCommand kDateTimeCommands[] = {
-    {{kAssign, Words(5), "OCIDateTimeAssign hEnv hError from to"}, RunAssign},
-    {{kCheck, WordsBetween(4, 5), "OCIDateTimeCheck hEnv hError date [valid]"}, RunCheck},
-    {{kCompare, WordsBetween(5, 6), "OCIDateTimeCompare hEnv hError date1 date2 [result]"}, RunCompare},
-    {{kConstruct, Words(13),
+    {{293, Words(5), "OCIDateTimeAssign hEnv hError from to"}, RunAssign},
+    {{294, WordsBetween(4, 5), "OCIDateTimeCheck hEnv hError date [valid]"}, RunCheck},
+    {{295, WordsBetween(5, 6), "OCIDateTimeCompare hEnv hError date1 date2 [result]"}, RunCompare},
+    {{296, Words(13),
       "OCIDateTimeConstruct hEnv hError hDate year month day hour min sec frac timezone timezone_len"},
      RunConstruct},
-    {{kGetDate, Words(4, 7), "OCIDateTimeGetDate hEnv hError hDate [year month day]"}, RunGetDate},
-    {{kGetTime, Words(4, 8), "OCIDateTimeGetTime hEnv hError hDate [hour minute second fraction]"}, RunGetTime},
-    {{kSetDate, Words(7), "OCIDateTimeSetDate hEnv hError hDate year month day"}, RunSetDate},
-    {{kSetTime, Words(8), "OCIDateTimeSetTime hEnv hError hDate hour min sec frac"}, RunSetTime},
+    {{331, Words(4, 7), "OCIDateTimeGetDate hEnv hError hDate [year month day]"}, RunGetDate},
+    {{332, Words(4, 8), "OCIDateTimeGetTime hEnv hError hDate [hour minute second fraction]"}, RunGetTime},
+    {{333, Words(7), "OCIDateTimeSetDate hEnv hError hDate year month day"}, RunSetDate},
+    {{334, Words(8), "OCIDateTimeSetTime hEnv hError hDate hour min sec frac"}, RunSetTime},
 };
 
 }  // namespace

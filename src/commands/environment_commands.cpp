@@ -6,10 +6,6 @@
 
 namespace {
 
-ub4 DecodeMode(const char* word) {
-    return static_cast<ub4>(DecodeBitmaskOrNumber(word, EnvModeKeywords));
-}
-
 // --- Memory callbacks ------------------------------------------------------------------------------------------------
 
 char my_context[] = "My  Context";
@@ -105,28 +101,24 @@ constexpr EnvironmentMaker kEnvironmentMakers[] = {
 
 // --- The process -----------------------------------------------------------------------------------------------------
 
-constexpr int kInitializeCode = 202;
-constexpr int kTerminateCode = 212;
-constexpr char kTerminateUsage[] = "OCITerminate mode";
-
 // The context is always the same here, whatever its word.
-void Initialize(int count, char** words) {
+void Initialize(const CommandRow& row, int count, char** words) {
     Callbacks callbacks;
     if (count > 2) callbacks = {my_context, MyMalloc, MyRealloc, MyFree};
     const sword rc = Call(&ClientLibrary::OCIInitialize, DecodeMode(words[1]), callbacks.context, callbacks.allocate,
                           callbacks.reallocate, callbacks.free);
-    outputOCI(kInitializeCode, rc, "");
+    outputOCI(row.code, rc, "");
     EnvironmentReport(nullptr, rc);
 }
 
 // The report comes before the trace. The memory count is printed and UTF-16 mode ends after a wrong word count, too.
-void Terminate(int count, char** words) {
+void Terminate(const CommandRow& row, int count, char** words) {
     if (count == 2) {
         const sword rc = Call(&ClientLibrary::OCITerminate, DecodeMode(words[1]));
         EnvironmentReport(DefaultEnvironment, rc);
-        outputOCI(kTerminateCode, rc, "");
+        outputOCI(row.code, rc, "");
     } else {
-        InvalidSyntax(kTerminateUsage);
+        InvalidSyntax(row.usage);
     }
     const sb4 blocks = Call(&ClientLibrary::OCI_memGetMemCount);
     if (blocks != 0) Message(kOutput, "Memory count - %ld\n", static_cast<long>(blocks));
@@ -134,8 +126,8 @@ void Terminate(int count, char** words) {
 }
 
 constexpr PlainCommand kProcessCommands[] = {
-    {{kInitializeCode, Words(2, 6), "OCIInitialize mode [ctxp mallocp reallocp freep]"}, Initialize},
-    {{kTerminateCode, kAnyWords, kTerminateUsage}, Terminate},
+    {{202, Words(2, 6), "OCIInitialize mode [ctxp mallocp reallocp freep]"}, Initialize},
+    {{212, kAnyWords, "OCITerminate mode"}, Terminate},
 };
 
 }  // namespace

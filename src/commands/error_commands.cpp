@@ -16,9 +16,6 @@
 
 namespace {
 
-constexpr int kErrorGetCode = 329;
-constexpr int kSetCallErrorCode = 330;
-
 void* ResolveDiagnosticHandle(int type, const char* name) {
     switch (type) {
         case OCI_HTYPE_ERROR: return ResolveError<void>(name);
@@ -67,7 +64,7 @@ void Record::Print() const {
     Message(kOutput, Utf16Mode ? "Message: W\"%s\"\n" : "Message: %s\n", shown.c_str());
 }
 
-void GetError(int count, char** words) {
+void GetError(const CommandRow& row, int count, char** words) {
     const int type = DecodeKeyword(words[4], HandleTypeKeywords);
     void* handle = ResolveDiagnosticHandle(type, words[1]);
     const auto number = static_cast<ub4>(DecodeNumber(words[2]));
@@ -83,19 +80,19 @@ void GetError(int count, char** words) {
                           record.has_code ? &record.code : nullptr,
                           record.has_text ? reinterpret_cast<OraText*>(record.text.data()) : nullptr,
                           static_cast<ub4>(size), static_cast<ub4>(type));
-    outputOCI(kErrorGetCode, rc, words[1]);
+    outputOCI(row.code, rc, words[1]);
     if (rc == OCI_SUCCESS || rc == OCI_SUCCESS_WITH_INFO) record.Print();
 }
 
-void SetCallError(int, char** words) {
+void SetCallError(const CommandRow&, int, char** words) {
     report_switch = DecodeNumber(words[1]);
     Message(kOutput, "SetCallErrorOCI set to %ld\n", static_cast<long>(report_switch));
 }
 
 constexpr PlainCommand kErrorCommands[] = {
-    {{kErrorGetCode, Words(5, 8),
+    {{329, Words(5, 8),
       "OCIErrorGet hHandle index cbErrorMsg handletype [sqlstate nativeerror message]"}, GetError},
-    {{kSetCallErrorCode, Words(2), "SetCallErrorOCI {0|1}"}, SetCallError},
+    {{330, Words(2), "SetCallErrorOCI {0|1}"}, SetCallError},
 };
 
 }  // namespace

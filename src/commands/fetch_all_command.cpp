@@ -214,7 +214,7 @@ bool Table::PrintRows(long most_rows) {
     }
 }
 
-void FetchAll(int count, char** words) {
+void FetchAll(const CommandRow&, int count, char** words) {
     constexpr long kAllRows = 99999999;
     Table table(Resolve<OCIStmt>(Kind::stmt, words[1]));
     const long most_rows = count > 2 ? DecodeLong(words[2]) : kAllRows;

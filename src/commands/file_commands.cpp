@@ -7,20 +7,12 @@
 #include "objects/memory.h"
 #include "objects/registry.h"
 #include "platform/client_library.h"
-#include "report/return_code.h"
 #include "report/trace.h"
 
 namespace {
 
-enum Code { kOpen = 276, kRead = 277, kSeek = 278, kWrite = 280 };
-
 OCIFileObject* FindFile(const char* word) {
     return Resolve<OCIFileObject>(Kind::file, word);
-}
-
-void TraceAndReport(int code, const Handles& handles, sword rc, const char* name) {
-    outputOCI(code, rc, name);
-    ReturnCodeReport(handles.error, rc);
 }
 
 // --- The package -----------------------------------------------------------------------------------------------------
@@ -34,7 +26,7 @@ constexpr PackageCommand kPackageCommands[] = {
 };
 void RunPackage(const PackageCommand& row, int, char** words) {
     const Handles handles(words);
-    TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error), "");
+    TraceAndReport(row.code, "", handles.error, Call(row.function, handles.environment, handles.error));
 }
 
 // --- An open file ----------------------------------------------------------------------------------------------------
@@ -51,13 +43,13 @@ void RunFile(const FileCommand& row, int, char** words) {
     const Handles handles(words);
     OCIFileObject* const file = FindFile(words[3]);
     const sword rc = Call(row.function, handles.environment, handles.error, file);
-    TraceAndReport(row.code, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc == OCI_SUCCESS && row.frees_name) Release(Kind::file, words[3]);
 }
 
 // Words that are none of their table's reach the library as what stands for "not found": for the type, that is how a
 // plain file is asked for.
-void RunOpen(int, char** words) {
+void RunOpen(const CommandRow& row, int, char** words) {
     const char* const name = words[3];
     const Handles handles(words);
     if (CheckInUse(Kind::file, name)) return;
@@ -71,14 +63,14 @@ void RunOpen(int, char** words) {
     OCIFileObject** const place = NewPlace(file, name);
     const sword rc = Call(&ClientLibrary::OCIFileOpen, handles.environment, handles.error, place, file_name.Text(),
                           path.Text(), mode, create, type);
-    TraceAndReport(kOpen, handles, rc, name);
+    TraceAndReport(row.code, name, handles.error, rc);
     if (rc == OCI_SUCCESS && place != nullptr) Register(Kind::file, name, file, handles.environment);
 }
 
 // Read in one go, at most this much: a larger length, or one below 0, is cut to it.
 constexpr ub4 kLargestRead = 16u << 20;
 
-void RunRead(int count, char** words) {
+void RunRead(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIFileObject* const file = FindFile(words[3]);
     const ub4 length = std::min(static_cast<ub4>(DecodeNumber(words[4])), kLargestRead);
@@ -89,7 +81,7 @@ void RunRead(int count, char** words) {
     ub4* const bytes_read_place = Place(bytes_read, count, words, 6);
     const sword rc = Call(&ClientLibrary::OCIFileRead, handles.environment, handles.error, file, buffer, length,
                           bytes_read_place);
-    TraceAndReport(kRead, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc != OCI_SUCCESS || bytes_read_place == nullptr) return;
     Message(kOutput, "Bytes read - %u\n", bytes_read);
     if (buffer == nullptr) return;
@@ -97,7 +89,7 @@ void RunRead(int count, char** words) {
     line.Text({buffer, std::min(bytes_read, length)}).Character('\n').Print();
 }
 
-void RunWrite(int count, char** words) {
+void RunWrite(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIFileObject* const file = FindFile(words[3]);
     TextArgument data;
@@ -106,12 +98,12 @@ void RunWrite(int count, char** words) {
     ub4* const bytes_written_place = Place(bytes_written, count, words, 6);
     const sword rc = Call(&ClientLibrary::OCIFileWrite, handles.environment, handles.error, file, data.Text(),
                           data.Length(), bytes_written_place);
-    TraceAndReport(kWrite, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc == OCI_SUCCESS && bytes_written_place != nullptr) Message(kOutput, "Bytes written - %u\n", bytes_written);
 }
 
 // Unknown words for origin and direction reach the library as what stands for "not found", cut to the argument's width.
-void RunSeek(int, char** words) {
+void RunSeek(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     OCIFileObject* const file = FindFile(words[3]);
     const uword origin = static_cast<uword>(DecodeKeyword(words[4], FileSeekKeywords));
@@ -119,7 +111,7 @@ void RunSeek(int, char** words) {
     const sb1 direction = static_cast<sb1>(DecodeKeyword(words[6], FileDirectionKeywords));
     const sword rc = Call(&ClientLibrary::OCIFileSeek, handles.environment, handles.error, file, origin, offset,
                           direction);
-    TraceAndReport(kSeek, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
 }
 
 // --- A file by its name ----------------------------------------------------------------------------------------------
@@ -141,15 +133,15 @@ template <class Answer> void RunNamedFile(const NamedFileCommand<Answer>& row, i
     Answer answer = 0;
     Answer* const place = Place(answer, count, words, 5);
     const sword rc = Call(row.function, handles.environment, handles.error, name.Text(), path.Text(), place);
-    TraceAndReport(row.code, handles, rc, "");
+    TraceAndReport(row.code, "", handles.error, rc);
     if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "%ld\n", static_cast<long>(answer));
 }
 
 constexpr PlainCommand kOtherFileCommands[] = {
-    {{kOpen, Words(9), "OCIFileOpen hEnv hError hFile filename path mode create type"}, RunOpen},
-    {{kRead, Words(5, 7), "OCIFileRead hEnv hError hFile bufl [buffer bytesread]"}, RunRead},
-    {{kWrite, WordsBetween(6, 7), "OCIFileWrite hEnv hError hFile data datalen [byteswritten]"}, RunWrite},
-    {{kSeek, Words(7), "OCIFileSeek hEnv hError hFile origin offset dir"}, RunSeek},
+    {{276, Words(9), "OCIFileOpen hEnv hError hFile filename path mode create type"}, RunOpen},
+    {{277, Words(5, 7), "OCIFileRead hEnv hError hFile bufl [buffer bytesread]"}, RunRead},
+    {{280, WordsBetween(6, 7), "OCIFileWrite hEnv hError hFile data datalen [byteswritten]"}, RunWrite},
+    {{278, Words(7), "OCIFileSeek hEnv hError hFile origin offset dir"}, RunSeek},
 };
 
 }  // namespace

@@ -72,8 +72,6 @@ constexpr Allocation kAllocations[] = {
 
 // --- Arrays of descriptors -------------------------------------------------------------------------------------------
 
-constexpr int kArrayAllocCode = 409;
-
 // Where the library puts the descriptors: a block of the driver's own, which a slot owns once the array has a name.
 class DescriptorArray {
 public:
@@ -102,7 +100,7 @@ void FillExtraMemory(const ExtraMemory& extra) {
     Message(kOutput, "Wrote %ld bytes to extra buffer successfully\n", static_cast<long>(extra.Size()));
 }
 
-void AllocateArray(int count, char** words) {
+void AllocateArray(const CommandRow& row, int count, char** words) {
     auto* const environment = Resolve<OCIEnv>(Kind::environment, words[1]);
     const char* const name = words[2];
     const ObjectType type = kNewArrayType.Decode(words[3]);
@@ -116,7 +114,7 @@ void AllocateArray(int count, char** words) {
     void** const place = object.Place() == nullptr ? nullptr : array.Get();
     const sword rc = Call(&ClientLibrary::OCIArrayDescriptorAlloc, environment, place, static_cast<ub4>(type.number),
                           elements, extra.Size(), extra.Place());
-    outputOCI(kArrayAllocCode, rc, name);
+    outputOCI(row.code, rc, name);
     EnvironmentReport(environment, rc);
     if (rc != OCI_SUCCESS) return;
     if (type.kind)
@@ -125,7 +123,7 @@ void AllocateArray(int count, char** words) {
 }
 
 constexpr PlainCommand kArrayCommands[] = {
-    {{kArrayAllocCode, Words(5, 6, 7),
+    {{409, Words(5, 6, 7),
       "OCIArrayDescriptorAlloc hEnv hHandle descriptortype array_size [extramem [null]]"},
      AllocateArray},
 };

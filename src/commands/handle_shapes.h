@@ -1,5 +1,5 @@
 // What the commands on handles share: the words for a new object and for extra memory, the shape of a call on one
-// handle, and what follows a call.
+// handle, and modes.
 #pragma once
 
 #include <cstddef>
@@ -14,10 +14,9 @@
 #include "report/return_code.h"
 #include "report/trace.h"
 
-// The trace line and the report. `name` is the word of the call's primary object.
-inline void TraceAndReport(int code, const char* name, OCIError* error, sword rc) {
-    outputOCI(code, rc, name);
-    ReturnCodeReport(error, rc);
+// A mode: words joined by "|", or a number.
+inline ub4 DecodeMode(const char* word, const KeywordTable* modes = EnvModeKeywords) {
+    return static_cast<ub4>(DecodeBitmaskOrNumber(word, modes));
 }
 
 // The environment that a named object was made from; null when there is no such object.

@@ -73,7 +73,7 @@ void RunNumberStep(const NumberStep& row, int, char** words) {
     NumberOperand operand;
     if (!operand.Resolve(words[2], error)) return;
     const sword rc = Call(row.function, error.Get(), operand.Copy());
-    TraceAndReport(row.code, error.Get(), rc);
+    TraceAndReport(row.code, "", error.Get(), rc);
     if (rc == OCI_SUCCESS && operand.Argument() != nullptr) PrintNumber(*operand.Argument(), error.Get());
 }
 
@@ -91,7 +91,7 @@ void RunNumberConstant(const NumberConstant& row, int count, char** words) {
     OCINumber value = kZeroNumber;
     OCINumber* const result = count > 2 && IsNull(words[2]) ? nullptr : &value;
     Call(row.function, error, result);
-    TraceAndReport(row.code, error, OCI_SUCCESS);
+    TraceAndReport(row.code, "", error, OCI_SUCCESS);
     if (result == nullptr || error == nullptr || !PrintAsReal(value, error)) return;
     if (count == 4) StoreNumberResult(words[3], value);
 }

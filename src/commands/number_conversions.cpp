@@ -1,3 +1,4 @@
+// The number commands that have handlers of their own: reals, integers and texts.
 #include "commands/number_conversions.h"
 
 #include <cerrno>
@@ -12,10 +13,6 @@
 #include "platform/numbers.h"
 
 namespace {
-
-enum Code {
-    kFromInt = 234, kFromReal = 235, kFromText = 236, kToInt = 260, kToReal = 261, kToRealArray = 262, kToText = 263
-};
 
 // --- Reals -----------------------------------------------------------------------------------------------------------
 
@@ -46,7 +43,7 @@ private:
     alignas(16) unsigned char bytes_[16] = {};
 };
 
-void RunFromReal(int count, char** words) {
+void RunFromReal(const CommandRow& row, int count, char** words) {
     OCIError* const error = ResolveError<OCIError>(words[1]);
     const int width = DecodeNumber(words[3]);
     Real real(width);
@@ -54,7 +51,7 @@ void RunFromReal(int count, char** words) {
     const void* const value = IsNull(words[2]) ? nullptr : real.Pointer();
     ResultPlace<OCINumber> result(count, words, 4);
     const sword rc = Call(&ClientLibrary::OCINumberFromReal, error, value, static_cast<uword>(width), result.Pointer());
-    Conclude(kFromReal, error, rc, result);
+    Conclude(row.code, error, rc, result);
 }
 
 // The way back from a real that the library made; a failure is reported.
@@ -64,7 +61,7 @@ bool NumberFromReal(const void* real, int width, OCIError* error, OCINumber& num
     return rc == OCI_SUCCESS;
 }
 
-void RunToReal(int count, char** words) {
+void RunToReal(const CommandRow& row, int count, char** words) {
     ErrorWord error(words[1]);
     NumberOperand operand;
     if (!operand.Resolve(words[2], error)) return;
@@ -74,7 +71,7 @@ void RunToReal(int count, char** words) {
     void* const place = result.Pointer() == nullptr ? nullptr : real.Pointer();
     const sword rc = Call(&ClientLibrary::OCINumberToReal, error.Get(), operand.Argument(), static_cast<uword>(width),
                           place);
-    TraceAndReport(kToReal, error.Get(), rc);
+    TraceAndReport(row.code, "", error.Get(), rc);
     if (rc != OCI_SUCCESS || place == nullptr) return;
     if (NumberFromReal(place, width, error.Get(), *result.Pointer())) result.PrintAndStore(error.Get());
 }
@@ -87,14 +84,12 @@ template <class T> Memory<T> Elements(size_t count, long size, const char* compl
     return block;
 }
 
-constexpr char kToRealArrayUsage[] = "OCINumberToRealArray hError elems datalen num1 num2 ... num_elems";
-
 // The operand words beyond `elems` are ignored; more elements than words are refused.
-void RunToRealArray(int count, char** words) {
+void RunToRealArray(const CommandRow& row, int count, char** words) {
     const int elems = DecodeNumber(words[2]);
     const int width = DecodeNumber(words[3]);
     char** const operands = words + 4;
-    if (elems < 0 || elems > count - 4) return InvalidSyntax(kToRealArrayUsage);
+    if (elems < 0 || elems > count - 4) return InvalidSyntax(row.usage);
     OCIError* const error = ResolveError<OCIError>(words[1]);
 
     const size_t size = static_cast<size_t>(elems);
@@ -111,7 +106,7 @@ void RunToRealArray(int count, char** words) {
     }
     const sword rc = Call(&ClientLibrary::OCINumberToRealArray, error, pointers.get(), static_cast<uword>(elems),
                           static_cast<uword>(width), reals.get());
-    TraceAndReport(kToRealArray, error, rc);
+    TraceAndReport(row.code, "", error, rc);
     if (rc != OCI_SUCCESS || !IsRealWidth(width)) return;
     for (size_t index = 0; index < size; ++index) {
         OCINumber number;
@@ -152,7 +147,7 @@ private:
     alignas(8) unsigned char bytes_[8] = {};
 };
 
-void RunFromInt(int count, char** words) {
+void RunFromInt(const CommandRow& row, int count, char** words) {
     OCIError* const error = ResolveError<OCIError>(words[1]);
     const int width = DecodeNumber(words[3]);
     const int sign = DecodeKeyword(words[4], NumberSignKeywords);
@@ -162,11 +157,11 @@ void RunFromInt(int count, char** words) {
     ResultPlace<OCINumber> result(count, words, 5);
     const sword rc = Call(&ClientLibrary::OCINumberFromInt, error, value, static_cast<uword>(width),
                           static_cast<uword>(sign), result.Pointer());
-    Conclude(kFromInt, error, rc, result);
+    Conclude(row.code, error, rc, result);
 }
 
 // A last word "null" stands for the number, not for the integer.
-void RunToInt(int count, char** words) {
+void RunToInt(const CommandRow& row, int count, char** words) {
     ErrorWord error(words[1]);
     NumberOperand operand;
     if (!operand.Resolve(words[2], error)) return;
@@ -176,7 +171,7 @@ void RunToInt(int count, char** words) {
     Integer integer(width, sign == OCI_NUMBER_SIGNED);
     const sword rc = Call(&ClientLibrary::OCINumberToInt, error.Get(), number, static_cast<uword>(width),
                           static_cast<uword>(sign), integer.Pointer());
-    TraceAndReport(kToInt, error.Get(), rc);
+    TraceAndReport(row.code, "", error.Get(), rc);
     if (rc == OCI_SUCCESS) integer.Print();
 }
 
@@ -187,17 +182,12 @@ constexpr int kLargestTextSize = 100;
 // does no harm.
 OraText text_area[32 * 1024];
 
-// A text and, in the word after it, its length.
-bool SetText(TextArgument& text, char** words) {
-    return text.Set(words[0], DecodeLong(words[1]), TextArea::four_times);
-}
-
-void RunToText(int count, char** words) {
+void RunToText(const CommandRow& row, int count, char** words) {
     ErrorWord error(words[1]);
     NumberOperand operand;
     TextArgument format;
     TextArgument nls;
-    if (!operand.Resolve(words[2], error) || !SetText(format, words + 3) || !SetText(nls, words + 5)) return;
+    if (!operand.Resolve(words[2], error) || !format.SetWords(words + 3) || !nls.SetWords(words + 5)) return;
     const int typed = DecodeNumber(words[7]);
     if (typed > kLargestTextSize) return Message(kError, "buf_size must be smaller than %d\n", kLargestTextSize);
     ub4 size = static_cast<ub4>(typed);
@@ -205,34 +195,34 @@ void RunToText(int count, char** words) {
     OraText* const text = count == 9 && IsNull(words[8]) ? nullptr : text_area;
     const sword rc = Call(&ClientLibrary::OCINumberToText, error.Get(), operand.Argument(), format.Text(),
                           format.Length(), nls.Text(), nls.Length(), size_place, text);
-    TraceAndReport(kToText, error.Get(), rc);
+    TraceAndReport(row.code, "", error.Get(), rc);
     if (rc != OCI_SUCCESS || text == nullptr) return;
     Line line;
     if (AddText(line, text, std::min<size_t>(size, sizeof text_area), Utf16Mode)) line.Character('\n').Print();
 }
 
-void RunFromText(int count, char** words) {
+void RunFromText(const CommandRow& row, int count, char** words) {
     OCIError* const error = ResolveError<OCIError>(words[1]);
     TextArgument number;
     TextArgument format;
     TextArgument nls;
-    if (!SetText(number, words + 2) || !SetText(format, words + 4) || !SetText(nls, words + 6)) return;
+    if (!number.SetWords(words + 2) || !format.SetWords(words + 4) || !nls.SetWords(words + 6)) return;
     ResultPlace<OCINumber> result(count, words, 8);
     const sword rc = Call(&ClientLibrary::OCINumberFromText, error, number.Text(), number.Length(), format.Text(),
                           format.Length(), nls.Text(), nls.Length(), result.Pointer());
-    TraceAndReport(kFromText, error, rc);
+    TraceAndReport(row.code, "", error, rc);
     if (rc == OCI_SUCCESS && result.Pointer() != nullptr) PrintAsReal(result.Value(), error);
 }
 
 constexpr PlainCommand kNumberConversions[] = {
-    {{kFromInt, WordsBetween(5, 6), "OCINumberFromInt hError number num_length num_s_flag [result]"}, RunFromInt},
-    {{kFromReal, WordsBetween(4, 5), "OCINumberFromReal hError number num_length [result]"}, RunFromReal},
-    {{kFromText, WordsBetween(8, 9), "OCINumberFromText hError num num_len fmt fmt_len nls nls_len [result]"},
+    {{234, WordsBetween(5, 6), "OCINumberFromInt hError number num_length num_s_flag [result]"}, RunFromInt},
+    {{235, WordsBetween(4, 5), "OCINumberFromReal hError number num_length [result]"}, RunFromReal},
+    {{236, WordsBetween(8, 9), "OCINumberFromText hError num num_len fmt fmt_len nls nls_len [result]"},
      RunFromText},
-    {{kToInt, WordsBetween(5, 6), "OCINumberToInt hError number datalen format [result]"}, RunToInt},
-    {{kToReal, WordsBetween(4, 5), "OCINumberToReal hError number datalen [result]"}, RunToReal},
-    {{kToRealArray, WordsFrom(5), kToRealArrayUsage}, RunToRealArray},
-    {{kToText, WordsBetween(8, 9), "OCINumberToText hError number fmt fmt_len nls nls_len bufsize [buf]"}, RunToText},
+    {{260, WordsBetween(5, 6), "OCINumberToInt hError number datalen format [result]"}, RunToInt},
+    {{261, WordsBetween(4, 5), "OCINumberToReal hError number datalen [result]"}, RunToReal},
+    {{262, WordsFrom(5), "OCINumberToRealArray hError elems datalen num1 num2 ... num_elems"}, RunToRealArray},
+    {{263, WordsBetween(8, 9), "OCINumberToText hError number fmt fmt_len nls nls_len bufsize [buf]"}, RunToText},
 };
 
 }  // namespace

@@ -8,12 +8,10 @@
 #include "core/state.h"
 #include "objects/buffers.h"
 #include "platform/client_library.h"
-#include "report/return_code.h"
 #include "report/trace.h"
 
 namespace {
 
-constexpr int kRowidToChar = 411;
 constexpr int kClosingZero = 2;  // of a UTF-16 text
 constexpr size_t kShownCharacters = 8;
 
@@ -40,7 +38,7 @@ void PrintRowid(const void* text, ub2 length) {
     Message(kOutput, "Length - %u Rowid %.*s...\n", length, static_cast<int>(kShownCharacters), shown.c_str());
 }
 
-void RunRowidToChar(int, char** words) {
+void RunRowidToChar(const CommandRow& row, int, char** words) {
     auto* const rowid = Resolve<OCIRowid>(Kind::rowid, words[1]);
     auto* const error = ResolveError<OCIError>(words[4]);
     MemBuffer* const buffer = FindBuffer(words[2]);
@@ -51,8 +49,7 @@ void RunRowidToChar(int, char** words) {
     unsigned char* const text = buffer == nullptr ? nullptr : buffer->data;
     ub2 length = typed;
     const sword rc = Call(&ClientLibrary::OCIRowidToChar, rowid, text, &length, error);
-    outputOCI(kRowidToChar, rc, words[1]);
-    ReturnCodeReport(error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
     if (rc != OCI_SUCCESS || buffer == nullptr) return;
     length = std::min(length, typed);
     std::fill_n(text + length, kClosingZero, static_cast<unsigned char>(0));
@@ -62,7 +59,7 @@ void RunRowidToChar(int, char** words) {
 }
 
 constexpr PlainCommand kRowidCommands[] = {
-    {{kRowidToChar, Words(5), "OCIRowidToChar hRowid buf bufl errhp"}, RunRowidToChar},
+    {{411, Words(5), "OCIRowidToChar hRowid buf bufl errhp"}, RunRowidToChar},
 };
 
 }  // namespace

@@ -10,15 +10,6 @@
 
 namespace {
 
-ub4 DecodeMode(const char* word, const KeywordTable* modes = EnvModeKeywords) {
-    return static_cast<ub4>(DecodeBitmaskOrNumber(word, modes));
-}
-
-// The text at words[0], its length at words[1]. False when the command ends here, which has been said.
-bool SetText(TextArgument& text, char** words) {
-    return text.Set(words[0], DecodeLong(words[1]), TextArea::four_times);
-}
-
 // --- Calls on one handle ---------------------------------------------------------------------------------------------
 
 // Where the library's own modes differ from those of environments, scripts give numbers.
@@ -58,12 +49,12 @@ constexpr HandleCall kHandleCalls[] = {
 struct LogonTexts {
     TextArgument user, password, server;
 
-    bool Set(char** words) { return SetText(user, words) && SetPassword(words + 2) && SetText(server, words + 4); }
+    bool Set(char** words) { return user.SetWords(words) && SetPassword(words + 2) && server.SetWords(words + 4); }
 
 private:
     // The start-up password stands in for any but "null"; a length of 0 stays 0.
     bool SetPassword(char** words) {
-        if (!replace_password || IsNull(words[0])) return SetText(password, words);
+        if (!replace_password || IsNull(words[0])) return password.SetWords(words);
         const auto length = DecodeLong(words[1]) == 0 ? 0L : static_cast<long>(start_up_password.size());
         return password.Set(start_up_password.c_str(), length, TextArea::four_times);
     }
@@ -103,30 +94,25 @@ constexpr Logon kLogons[] = {
 
 // --- Calls with texts ------------------------------------------------------------------------------------------------
 
-constexpr int kServerAttachCode = 208;
-constexpr int kServerVersionCode = 218;
-constexpr int kClientVersionCode = 217;
-constexpr int kPasswordChangeCode = 281;
-
-void AttachServer(int, char** words) {
+void AttachServer(const CommandRow& row, int, char** words) {
     auto* const server = Resolve<OCIServer>(Kind::server, words[1]);
     auto* const error = ResolveError<OCIError>(words[2]);
     TextArgument name;
-    if (!SetText(name, words + 3)) return;
+    if (!name.SetWords(words + 3)) return;
     const sword rc = Call(&ClientLibrary::OCIServerAttach, server, error, name.Text(), static_cast<sb4>(name.Length()),
                           DecodeMode(words[5], ServerAttachKeywords));
-    TraceAndReport(kServerAttachCode, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
 }
 
-void ChangePassword(int, char** words) {
+void ChangePassword(const CommandRow& row, int, char** words) {
     auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
     auto* const error = ResolveError<OCIError>(words[2]);
     TextArgument user, old_password, new_password;
-    if (!SetText(user, words + 3) || !SetText(old_password, words + 5) || !SetText(new_password, words + 7)) return;
+    if (!user.SetWords(words + 3) || !old_password.SetWords(words + 5) || !new_password.SetWords(words + 7)) return;
     const sword rc = Call(&ClientLibrary::OCIPasswordChange, svc, error, user.Text(), user.Length(),
                           old_password.Text(), old_password.Length(), new_password.Text(),
                           static_cast<sb4>(new_password.Length()), DecodeMode(words[9]));
-    TraceAndReport(kPasswordChangeCode, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
 }
 
 // --- Versions --------------------------------------------------------------------------------------------------------
@@ -146,7 +132,7 @@ size_t RoomFor(int typed_length) {
     return static_cast<size_t>(typed_length < 0 ? kMost : std::clamp(typed_length, kLeast, kMost));
 }
 
-void ShowServerVersion(int count, char** words) {
+void ShowServerVersion(const CommandRow& row, int count, char** words) {
     constexpr int kOwnLength = 40;
     const int type = DecodeKeyword(words[3], HandleTypeKeywords);
     void* const handle = ResolveVersionHandle(type, words[3], words[1]);
@@ -156,7 +142,7 @@ void ShowServerVersion(int count, char** words) {
     OraText* const text = count == 6 && IsNull(words[4]) ? nullptr : room.data();
     const sword rc = Call(&ClientLibrary::OCIServerVersion, handle, error, text, static_cast<ub4>(length),
                           static_cast<ub1>(type));
-    TraceAndReport(kServerVersionCode, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
     if (text == nullptr || (rc != OCI_SUCCESS && rc != OCI_SUCCESS_WITH_INFO)) return;
     const size_t shown = Utf16Mode ? Utf16Length(text, room.size())
                                    : strnlen(reinterpret_cast<const char*>(text), room.size());
@@ -165,13 +151,13 @@ void ShowServerVersion(int count, char** words) {
 }
 
 // A number that is given no place prints as "null".
-void ShowClientVersion(int count, char** words) {
+void ShowClientVersion(const CommandRow& row, int count, char** words) {
     sword numbers[5] = {};
     sword* places[5];
     for (int index = 0; index < 5; ++index)
         places[index] = count > 1 && IsNull(words[1 + index]) ? nullptr : &numbers[index];
     Call(&ClientLibrary::OCIClientVersion, places[0], places[1], places[2], places[3], places[4]);
-    outputOCI(kClientVersionCode, OCI_SUCCESS, "");
+    outputOCI(row.code, OCI_SUCCESS, "");
     Line line;
     for (const sword* place : places) {
         if (!line.Empty()) line.Character('.');
@@ -182,13 +168,13 @@ void ShowClientVersion(int count, char** words) {
 }
 
 constexpr PlainCommand kPlainCommands[] = {
-    {{kServerAttachCode, Words(6), "OCIServerAttach hServer hError server server_len mode"}, AttachServer},
+    {{208, Words(6), "OCIServerAttach hServer hError server server_len mode"}, AttachServer},
     // The bracket that its words open is not closed: logs have it so.
-    {{kClientVersionCode, Words(1, 6),
+    {{217, Words(1, 6),
       "OCIClientVersion [major_version minor_version update_num patch_num port_update_num"},
      ShowClientVersion},
-    {{kServerVersionCode, Words(4, 6), "OCIServerVersion handle hError handletype [buf buf_len]"}, ShowServerVersion},
-    {{kPasswordChangeCode, Words(10),
+    {{218, Words(4, 6), "OCIServerVersion handle hError handletype [buf buf_len]"}, ShowServerVersion},
+    {{281, Words(10),
       "OCIPasswordChange hSvc hError username username_len opassword opassword_len npassword npassword_len mode"},
      ChangePassword},
 };

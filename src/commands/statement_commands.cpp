@@ -9,15 +9,8 @@
 
 namespace {
 
-enum Code { kPrepare = 314, kPrepare2 = 315, kRelease = 316, kExecute = 311, kGetBindInfo = 336 };
-
 ub4 DecodeCount(const char* word) {
     return static_cast<ub4>(DecodeNumber(word));
-}
-
-// The text at words[0], its length at words[1]. False when the command ends here, which has been said.
-bool SetText(TextArgument& text, char** words) {
-    return text.Set(words[0], DecodeLong(words[1]), TextArea::four_times_and_one);
 }
 
 // The display of values asks for the mode under which the statement's data came.
@@ -27,62 +20,63 @@ void RecordUtf16Mode(NamedObject* statement) {
 
 // --- Preparing and executing -----------------------------------------------------------------------------------------
 
-void Prepare(int, char** words) {
+void Prepare(const CommandRow& row, int, char** words) {
     auto* const statement = Resolve<OCIStmt>(Kind::stmt, words[1]);
     auto* const error = ResolveError<OCIError>(words[2]);
     TextArgument text;
-    if (!SetText(text, words + 3)) return;
+    if (!text.SetWords(words + 3, TextArea::four_times_and_one)) return;
     const ub4 syntax = DecodeStatementMode(words[5], SyntaxKeywords);
     const ub4 mode = DecodeStatementMode(words[6], Prepare2ModeKeywords);
     const sword rc = Call(&ClientLibrary::OCIStmtPrepare, statement, error, text.Text(), text.Length(), syntax, mode);
-    TraceAndReport(kPrepare, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
     RecordUtf16Mode(FindByName(Kind::stmt, words[1]));
 }
 
-void PrepareNew(int, char** words) {
+void PrepareNew(const CommandRow& row, int, char** words) {
     auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
     auto* const error = ResolveError<OCIError>(words[3]);
     const char* const name = words[2];
     if (CheckInUse(Kind::stmt, name)) return;
     NewObject<OCIStmt> statement(name);
     TextArgument text, key;
-    if (!SetText(text, words + 4) || !SetText(key, words + 6)) return;
+    if (!text.SetWords(words + 4, TextArea::four_times_and_one)) return;
+    if (!key.SetWords(words + 6, TextArea::four_times_and_one)) return;
     const ub4 syntax = DecodeStatementMode(words[8], SyntaxKeywords);
     const ub4 mode = DecodeStatementMode(words[9], Prepare2ModeKeywords);
     const sword rc = Call(&ClientLibrary::OCIStmtPrepare2, svc, statement.Place(), error, text.Text(), text.Length(),
                           key.Text(), key.Length(), syntax, mode);
-    TraceAndReport(kPrepare2, name, error, rc);
+    TraceAndReport(row.code, name, error, rc);
     if (rc == OCI_SUCCESS) RecordUtf16Mode(statement.Enter(Kind::stmt, ParentOf(Kind::svc, words[1])));
 }
 
-void ReleaseStatement(int, char** words) {
+void ReleaseStatement(const CommandRow& row, int, char** words) {
     auto* const statement = Resolve<OCIStmt>(Kind::stmt, words[1]);
     auto* const error = ResolveError<OCIError>(words[2]);
     TextArgument key;
-    if (!SetText(key, words + 3)) return;
+    if (!key.SetWords(words + 3, TextArea::four_times_and_one)) return;
     const ub4 mode = DecodeStatementMode(words[5], ReleaseModeKeywords);
     const sword rc = Call(&ClientLibrary::OCIStmtRelease, statement, error, key.Text(), key.Length(), mode);
-    TraceAndReport(kRelease, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
     if (rc == OCI_SUCCESS) Release(Kind::stmt, words[1]);
 }
 
-void Execute(int, char** words) {
+void Execute(const CommandRow& row, int, char** words) {
     auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
     auto* const statement = Resolve<OCIStmt>(Kind::stmt, words[2]);
     auto* const error = ResolveError<OCIError>(words[3]);
     const ub4 mode = DecodeStatementMode(words[6], ExecuteModeKeywords);
     const sword rc = Call(&ClientLibrary::OCIStmtExecute, svc, statement, error, DecodeCount(words[4]),
                           DecodeCount(words[5]), nullptr, nullptr, mode);
-    TraceAndReport(kExecute, words[2], error, rc);
+    TraceAndReport(row.code, words[2], error, rc);
     RecordUtf16Mode(FindByName(Kind::stmt, words[2]));
 }
 
 constexpr PlainCommand kPlainCommands[] = {
-    {{kPrepare, Words(7), "OCIStmtPrepare hStmt hError stmttext stmttext_len syntax mode"}, Prepare},
-    {{kPrepare2, Words(10), "OCIStmtPrepare2 hSvc hStmt hError stmttext stmttext_len key key_len syntax mode"},
+    {{314, Words(7), "OCIStmtPrepare hStmt hError stmttext stmttext_len syntax mode"}, Prepare},
+    {{315, Words(10), "OCIStmtPrepare2 hSvc hStmt hError stmttext stmttext_len key key_len syntax mode"},
      PrepareNew},
-    {{kRelease, Words(6), "OCIStmtRelease hStmt hError key keylen mode"}, ReleaseStatement},
-    {{kExecute, Words(7), "OCIStmtExecute hSvc hStmt hError rows rowoffset mode"}, Execute},
+    {{316, Words(6), "OCIStmtRelease hStmt hError key keylen mode"}, ReleaseStatement},
+    {{311, Words(7), "OCIStmtExecute hSvc hStmt hError rows rowoffset mode"}, Execute},
 };
 
 constexpr HandleCall kHandleCalls[] = {
@@ -172,7 +166,7 @@ bool BindInfo::Print(ub4 index) const {
 // The seven output words that a longer line gives: each may refuse its array.
 enum OutputWord { kFound = 5, kNames, kNameLengths, kIndicators, kIndicatorLengths, kDuplicates, kBinds };
 
-void GetBindInfo(int count, char** words) {
+void GetBindInfo(const CommandRow& row, int count, char** words) {
     auto* const statement = Resolve<OCIStmt>(Kind::stmt, words[1]);
     auto* const error = ResolveError<OCIError>(words[2]);
     const ub4 size = DecodeCount(words[3]);
@@ -185,7 +179,7 @@ void GetBindInfo(int count, char** words) {
                           place(&info.found, kFound), place(info.names, kNames), place(info.name_lengths, kNameLengths),
                           place(info.indicators, kIndicators), place(info.indicator_lengths, kIndicatorLengths),
                           place(info.duplicates, kDuplicates), place(info.binds, kBinds));
-    TraceAndReport(kGetBindInfo, words[1], error, rc);
+    TraceAndReport(row.code, words[1], error, rc);
     if (rc != OCI_SUCCESS && rc != OCI_SUCCESS_WITH_INFO) return;
     Message(kOutput, "found - %ld\n", static_cast<long>(info.found));
     for (ub4 index = 0; index < info.Entries(size); ++index)
@@ -193,7 +187,7 @@ void GetBindInfo(int count, char** words) {
 }
 
 constexpr PlainCommand kBindInfoCommands[] = {
-    {{kGetBindInfo, Words(5, 12),
+    {{336, Words(5, 12),
       "OCIStmtGetBindInfo hStmt hError size startloc [pfound pbvnp pbvnl pinvp pinpl pdupl phndl]"},
      GetBindInfo},
 };

@@ -5,7 +5,6 @@
 #include "core/state.h"
 #include "objects/registry.h"
 #include "platform/client_library.h"
-#include "report/return_code.h"
 #include "report/trace.h"
 
 namespace {
@@ -59,8 +58,7 @@ public:
 
     // All that follows the call. The library may have moved the object.
     void Conclude(const CommandRow& row, const Handles& handles, sword rc) {
-        outputOCI(row.code, rc, word_);
-        ReturnCodeReport(handles.error, rc);
+        TraceAndReport(row.code, word_, handles.error, rc);
         if (slot_ != nullptr)
             slot_->object = object_;
         else if (rc == OCI_SUCCESS && Place() != nullptr)
@@ -124,15 +122,11 @@ template <class Object> void ShowAllocatedSize(const CommandRow& row, int count,
     ub4 size = 0;
     ub4* const place = Place(size, count, words, 4);
     const sword rc = Call(Traits<Object>::kAllocSize, handles.environment, handles.error, object, place);
-    outputOCI(row.code, rc, words[3]);
-    ReturnCodeReport(handles.error, rc);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "%u\n", size);
 }
 
-struct StringCommand : CommandRow {
-    void (*run)(const CommandRow& row, int count, char** words);
-};
-constexpr StringCommand kStringCommands[] = {
+constexpr PlainCommand kStringCommands[] = {
     {{265, WordsBetween(4, 5), "OCIStringAllocSize hEnv hError string [pcbString]"}, ShowAllocatedSize<OCIString>},
     {{266, Words(5), "OCIStringAssign hEnv hError stringrhs stringlhs"}, Assign<OCIString>},
     {{267, Words(6), "OCIStringAssignText hEnv hError string string_len stringlhs"}, AssignText<OCIString>},
@@ -146,12 +140,9 @@ constexpr StringCommand kStringCommands[] = {
     {{358, Words(3), "OCIRawPtr hEnv raw"}, ShowContents<OCIRaw>},
     {{359, Words(3), "OCIRawSize hEnv raw"}, ShowSize<OCIRaw>},
 };
-void Run(const StringCommand& row, int count, char** words) {
-    row.run(row, count, words);
-}
 
 }  // namespace
 
 void AddStringCommands(HandlerTable& handlers) {
-    handlers.Add<Run>(kStringCommands);
+    handlers.Add(kStringCommands);
 }

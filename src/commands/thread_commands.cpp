@@ -9,15 +9,9 @@
 #include "core/state.h"
 #include "objects/registry.h"
 #include "platform/client_library.h"
-#include "report/return_code.h"
 #include "report/trace.h"
 
 namespace {
-
-enum Code {
-    kProcessInit = 377, kIsMulti = 382, kKeyInit = 385, kKeySet = 387, kKeyGet = 388, kIdNull = 391, kIdSame = 393,
-    kIdSet = 395, kCreate = 399
-};
 
 template <class Object> constexpr Kind kKind = Kind::mutex;
 template <> constexpr Kind kKind<OCIThreadKey> = Kind::key;
@@ -28,22 +22,17 @@ template <class Object> Object* Find(const char* word) {
     return Resolve<Object>(kKind<Object>, word);
 }
 
-void TraceAndReport(int code, const Handles& handles, sword rc, const char* name) {
-    outputOCI(code, rc, name);
-    ReturnCodeReport(handles.error, rc);
-}
-
 // --- The process and the package -------------------------------------------------------------------------------------
 
-void RunProcessInit(int, char**) {
+void RunProcessInit(const CommandRow& row, int, char**) {
     Call(&ClientLibrary::OCIThreadProcessInit);
-    outputOCI(kProcessInit, OCI_SUCCESS, "");
+    outputOCI(row.code, OCI_SUCCESS, "");
     Message(kOutput, "OCIThreadProcessInit called\n");
 }
 
-void RunIsMulti(int, char**) {
+void RunIsMulti(const CommandRow& row, int, char**) {
     const boolean is_multi = Call(&ClientLibrary::OCIThreadIsMulti);
-    outputOCI(kIsMulti, OCI_SUCCESS, "");
+    outputOCI(row.code, OCI_SUCCESS, "");
     Message(kOutput, "OCIThreadIsMulti %d\n", is_multi);
 }
 
@@ -56,7 +45,7 @@ constexpr PackageCommand kPackageCommands[] = {
 };
 void RunPackage(const PackageCommand& row, int, char** words) {
     const Handles handles(words);
-    TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error), words[1]);
+    TraceAndReport(row.code, words[1], handles.error, Call(row.function, handles.environment, handles.error));
 }
 
 // --- Making and destroying named objects -----------------------------------------------------------------------------
@@ -82,7 +71,7 @@ template <class Object, class Function> void Make(int code, char** words, Functi
     Object* object = nullptr;
     Object** const place = NewPlace(object, name);
     const sword rc = make(handles, place);
-    TraceAndReport(code, handles, rc, name);
+    TraceAndReport(code, name, handles.error, rc);
     if (rc == OCI_SUCCESS && place != nullptr) Register(kKind<Object>, name, object, handles.environment);
 }
 template <class Object> void RunMaking(const Making<Object>& row, int, char** words) {
@@ -91,9 +80,9 @@ template <class Object> void RunMaking(const Making<Object>& row, int, char** wo
     });
 }
 // A fifth word, whatever it is, installs the destructor.
-void RunKeyInit(int count, char** words) {
+void RunKeyInit(const CommandRow& row, int count, char** words) {
     const OCIThreadKeyDestFunc destructor = count == 5 ? MyThreadKeyDescructor : nullptr;
-    Make<OCIThreadKey>(kKeyInit, words, [=](const Handles& handles, OCIThreadKey** place) {
+    Make<OCIThreadKey>(row.code, words, [=](const Handles& handles, OCIThreadKey** place) {
         return Call(&ClientLibrary::OCIThreadKeyInit, handles.environment, handles.error, place, destructor);
     });
 }
@@ -115,7 +104,7 @@ template <class Object> void RunDestroying(const Destroying<Object>& row, int, c
     const Handles handles(words);
     Object* object = Find<Object>(words[3]);
     const sword rc = Call(row.function, handles.environment, handles.error, &object);
-    TraceAndReport(row.code, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc == OCI_SUCCESS) Release(kKind<Object>, words[3]);
 }
 
@@ -140,7 +129,7 @@ constexpr Use<OCIThreadHandle> kHandleUses[] = {
 template <class Object> void RunUse(const Use<Object>& row, int, char** words) {
     const Handles handles(words);
     Object* const object = Find<Object>(words[3]);
-    TraceAndReport(row.code, handles, Call(row.function, handles.environment, handles.error, object), words[3]);
+    TraceAndReport(row.code, words[3], handles.error, Call(row.function, handles.environment, handles.error, object));
 }
 
 // --- Values of keys --------------------------------------------------------------------------------------------------
@@ -158,7 +147,7 @@ KeyText& KeyTextOf(const char* key) {
 }
 
 // A call that fails leaves the key its old text.
-void RunKeySet(int, char** words) {
+void RunKeySet(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     OCIThreadKey* const key = Find<OCIThreadKey>(words[3]);
     KeyText& place = KeyTextOf(words[3]);
@@ -167,54 +156,54 @@ void RunKeySet(int, char** words) {
     const sword rc = Call(&ClientLibrary::OCIThreadKeySet, handles.environment, handles.error, key,
                           IsNull(words[4]) ? nullptr : place.text);
     if (rc != OCI_SUCCESS) place = old;
-    TraceAndReport(kKeySet, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
 }
 
-void RunKeyGet(int count, char** words) {
+void RunKeyGet(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     OCIThreadKey* const key = Find<OCIThreadKey>(words[3]);
     void* value = nullptr;
     void** const place = Place(value, count, words, 4);
     const sword rc = Call(&ClientLibrary::OCIThreadKeyGet, handles.environment, handles.error, key, place);
-    TraceAndReport(kKeyGet, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc != OCI_SUCCESS || place == nullptr) return;
     Message(kOutput, "OCIThreadKeyGet - %s\n", value == nullptr ? "null" : static_cast<const char*>(value));
 }
 
 // --- Thread identifiers ----------------------------------------------------------------------------------------------
 
-void RunIdSet(int, char** words) {
+void RunIdSet(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     auto* const target = Find<OCIThreadId>(words[3]);
     auto* const source = Find<OCIThreadId>(words[4]);
     const sword rc = Call(&ClientLibrary::OCIThreadIdSet, handles.environment, handles.error, target, source);
-    TraceAndReport(kIdSet, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
 }
 
-void RunIdSame(int count, char** words) {
+void RunIdSame(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     auto* const left = Find<OCIThreadId>(words[3]);
     auto* const right = Find<OCIThreadId>(words[4]);
     boolean same = FALSE;
     boolean* const place = Place(same, count, words, 5);
     const sword rc = Call(&ClientLibrary::OCIThreadIdSame, handles.environment, handles.error, left, right, place);
-    TraceAndReport(kIdSame, handles, rc, words[1]);
+    TraceAndReport(row.code, words[1], handles.error, rc);
     if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "OCIThreadIdSame - %d\n", same);
 }
 
-void RunIdNull(int count, char** words) {
+void RunIdNull(const CommandRow& row, int count, char** words) {
     const Handles handles(words);
     auto* const identifier = Find<OCIThreadId>(words[3]);
     boolean is_null = FALSE;
     boolean* const place = Place(is_null, count, words, 4);
     const sword rc = Call(&ClientLibrary::OCIThreadIdNull, handles.environment, handles.error, identifier, place);
-    TraceAndReport(kIdNull, handles, rc, words[3]);
+    TraceAndReport(row.code, words[3], handles.error, rc);
     if (rc == OCI_SUCCESS && place != nullptr) Message(kOutput, "OCIThreadIdNull - %d\n", is_null);
 }
 
 // --- Threads ---------------------------------------------------------------------------------------------------------
 
-void RunCreate(int, char** words) {
+void RunCreate(const CommandRow& row, int, char** words) {
     const Handles handles(words);
     const OCIThreadStartFunction start = IsNull(words[3]) ? nullptr : ChildThread;
     auto* const key = Find<OCIThreadKey>(words[4]);
@@ -223,19 +212,19 @@ void RunCreate(int, char** words) {
     SetChildHandles(DefaultEnvironment, DefaultErrorHandle);
     const sword rc = Call(&ClientLibrary::OCIThreadCreate, handles.environment, handles.error, start, key, identifier,
                           thread);
-    TraceAndReport(kCreate, handles, rc, words[6]);
+    TraceAndReport(row.code, words[6], handles.error, rc);
 }
 
 constexpr PlainCommand kOtherThreadCommands[] = {
-    {{kProcessInit, Words(1), "OCIThreadProcessInit"}, RunProcessInit},
-    {{kIsMulti, Words(1), "OCIThreadIsMulti"}, RunIsMulti},
-    {{kKeyInit, WordsBetween(4, 5), "OCIThreadKeyInit hEnv hError key [destFn]"}, RunKeyInit},
-    {{kKeySet, Words(5), "OCIThreadKeySet hEnv hError key value"}, RunKeySet},
-    {{kKeyGet, WordsBetween(4, 5), "OCIThreadKeyGet hEnv hError key [value]"}, RunKeyGet},
-    {{kIdNull, WordsBetween(4, 5), "OCIThreadIdNull hEnv hError tid [result]"}, RunIdNull},
-    {{kIdSame, WordsBetween(5, 6), "OCIThreadIdSame hEnv hError tid1 tid2 [result]"}, RunIdSame},
-    {{kIdSet, Words(5), "OCIThreadIdSet hEnv hError tidDest tidSrc"}, RunIdSet},
-    {{kCreate, Words(7), "OCIThreadCreate hEnv hError child key tid thnd"}, RunCreate},
+    {{377, Words(1), "OCIThreadProcessInit"}, RunProcessInit},
+    {{382, Words(1), "OCIThreadIsMulti"}, RunIsMulti},
+    {{385, WordsBetween(4, 5), "OCIThreadKeyInit hEnv hError key [destFn]"}, RunKeyInit},
+    {{387, Words(5), "OCIThreadKeySet hEnv hError key value"}, RunKeySet},
+    {{388, WordsBetween(4, 5), "OCIThreadKeyGet hEnv hError key [value]"}, RunKeyGet},
+    {{391, WordsBetween(4, 5), "OCIThreadIdNull hEnv hError tid [result]"}, RunIdNull},
+    {{393, WordsBetween(5, 6), "OCIThreadIdSame hEnv hError tid1 tid2 [result]"}, RunIdSame},
+    {{395, Words(5), "OCIThreadIdSet hEnv hError tidDest tidSrc"}, RunIdSet},
+    {{399, Words(7), "OCIThreadCreate hEnv hError child key tid thnd"}, RunCreate},
 };
 
 }  // namespace

@@ -21,7 +21,7 @@ bool BeginsWith(const char* word, const char* beginning) {
 // --- Options ---------------------------------------------------------------------------------------------------------
 
 // Options are only ever switched on, and whatever is not understood passes in silence.
-void SetOption(int count, char** words) {
+void SetOption(const CommandRow&, int count, char** words) {
     if (count == 3 && BeginsWith(words[1], "REPLACEPWD") && password_given) replace_password = true;
     if (count == 2 && BeginsWith(words[1], "PRINTSQLFUNCTIONCODE")) print_sql_function_code = true;
 }
@@ -31,7 +31,6 @@ void SetOption(int count, char** words) {
 constexpr char kIniFile[] = "kelpcli.ini";
 constexpr char kIniSection[] = "kelpci";
 constexpr size_t kIniRoom = 65000;
-constexpr char kReadIniUsage[] = "ReadIni [keyword]\n";
 
 Memory<char> AllocateIniRoom() {
     return Memory<char>(static_cast<char*>(GetMem(kIniRoom)));
@@ -54,20 +53,20 @@ void PrintAllSettings() {
 }
 
 // The one complaint about a word count that goes to the output stream.
-void ReadIni(int count, char** words) {
-    if (count > 2) return Message(kOutput, "Invalid Syntax: %s\n", kReadIniUsage);
+void ReadIni(const CommandRow& row, int count, char** words) {
+    if (count > 2) return Message(kOutput, "Invalid Syntax: %s\n", row.usage);
     if (count == 2) PrintSetting(words[1]);
     else PrintAllSettings();
 }
 
-void WriteIni(int count, char** words) {
+void WriteIni(const CommandRow&, int count, char** words) {
     IniWriteString(kIniFile, kIniSection, words[1], count == 3 ? words[2] : nullptr);
 }
 
 // --- Surroundings ----------------------------------------------------------------------------------------------------
 
 // Said of a file that was not there, too.
-void DeleteFile(int, char** words) {
+void DeleteFile(const CommandRow&, int, char** words) {
     static_cast<void>(std::remove(words[1]));
     Message(kOutput, "File %s removed\n", words[1]);
 }
@@ -79,7 +78,7 @@ int CategoryOf(const char* word) {
     return category == kNotFound ? kNotFound : kCategories[category];
 }
 
-void SetLocale(int, char** words) {
+void SetLocale(const CommandRow&, int, char** words) {
     const int category = CategoryOf(words[1]);
     const char* locale = IsNull(words[2]) ? nullptr : words[2];
     if (SameIgnoringCase(words[2], "en_US")) locale = "american";
@@ -88,16 +87,17 @@ void SetLocale(int, char** words) {
     Message(kOutput, locale == nullptr ? "Current locale is not null\n" : "setlocale succeeded\n");
 }
 
-void Pause(int count, char** words) {
-    if (count != 2) return Message(kError, "Syntax Error: pause sleep_in_milliseconds\n");
+// Its complaint begins in words of its own.
+void Pause(const CommandRow& row, int count, char** words) {
+    if (count != 2) return Message(kError, "Syntax Error: %s\n", row.usage);
     SleepMilliseconds(DecodeLong(words[1]));
 }
 
-void DebugMemory(int, char**) {}
+void DebugMemory(const CommandRow&, int, char**) {}
 
 constexpr PlainCommand kUtilityCommands[] = {
     {{50, kAnyWords, ""}, SetOption},
-    {{52, kAnyWords, kReadIniUsage}, ReadIni},
+    {{52, kAnyWords, "ReadIni [keyword]\n"}, ReadIni},
     {{51, Words(2, 3), "WriteIni keyword [value]\n"}, WriteIni},
     {{367, Words(2), "DeleteFile filename\n"}, DeleteFile},
     {{413, Words(3), "setlocale category locale\n"}, SetLocale},

@@ -91,15 +91,9 @@ template <class... Operands> bool ResolveOperands(std::tuple<Operands...>& opera
     return std::apply([&](auto&... operand) { return (operand.Resolve(*words++, error) && ...); }, operands);
 }
 
-// The trace line and the report.
-inline void TraceAndReport(int code, OCIError* error, sword rc) {
-    outputOCI(code, rc, "");
-    ReturnCodeReport(error, rc);
-}
-
 // All that follows a call: trace, report and, after success, the result.
 template <class T> void Conclude(int code, OCIError* error, sword rc, ResultPlace<T>& result) {
-    TraceAndReport(code, error, rc);
+    TraceAndReport(code, "", error, rc);
     if (rc == OCI_SUCCESS) result.PrintAndStore(error);
 }
 
@@ -115,6 +109,6 @@ void RunValueOperation(const ValueOperation<Result, Operands...>& row, int count
         },
         operands);
     if (row.outcome == Outcome::as_the_word_says) return Conclude(row.code, error.Get(), rc, result);
-    TraceAndReport(row.code, error.Get(), rc);
+    TraceAndReport(row.code, "", error.Get(), rc);
     if (rc == OCI_SUCCESS) ResultForm<Result>::Print(result.Value(), error.Get());
 }

@@ -52,9 +52,9 @@ struct CommandRow {
     const char* usage;
 };
 
-// A command that shares its handler with no other.
+// A command whose handler is a column of its own row.
 struct PlainCommand : CommandRow {
-    void (*run)(int count, char** words);
+    void (*run)(const CommandRow& row, int count, char** words);
 };
 
 // Code to handler. A family of commands adds its rows once, at start-up; the rows must live as long as the process.
@@ -76,10 +76,7 @@ public:
         Add<Run>(std::span<const Row>(rows));
     }
     template <size_t kCount> void Add(const PlainCommand (&rows)[kCount]) {
-        for (const PlainCommand& row : rows)
-            Set(row, [](const CommandRow& base, int count, char** words) {
-                static_cast<const PlainCommand&>(base).run(count, words);
-            });
+        for (const PlainCommand& row : rows) Set(row, row.run);
     }
     // Null when no family has added the code.
     const Handler* Find(int code) const;

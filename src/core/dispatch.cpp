@@ -22,7 +22,7 @@ HandlerTable AllHandlers() {
 
 void Run(int code, int count, char** words) {
     const HandlerTable::Handler* handler = Handlers().Find(code);
-    if (handler == nullptr) return Message(kError, "ReadAndEvaluateScript(): %s", "Case error !\n");
+    if (handler == nullptr) return Message(kError, "ReadAndEvaluateScript(): Case error !\n");
     if (!handler->row->words.Has(count)) return InvalidSyntax(handler->row->usage);
     handler->run(*handler->row, count, words);
 }
@@ -38,7 +38,7 @@ int Dispatch(int count, char** words) {
     if (words[0][0] == '\0') Message(kError, "DecodeKeyword(): Null length token.\n");
     const Command* command = FindCommand(words[0]);
     if (command == nullptr) {
-        Message(kError, "Syntax Error: %s !\n", "First token is not a valid command");
+        Message(kError, "Syntax Error: First token is not a valid command !\n");
         return 0;
     }
     if (command->code == kExitCode) return kStopLoop;

@@ -23,7 +23,7 @@ constexpr const char* kBanner[] = {
 
 void FetchCodePages() {
     const int rc = GetProcessCodePage(&application_code_page, &second_code_page);
-    if (rc != 0) Message(kError, "%s failed with rc - %ld\n", "GetProcessCodePage", static_cast<long>(rc));
+    if (rc != 0) Message(kError, "GetProcessCodePage failed with rc - %ld\n", static_cast<long>(rc));
 }
 
 // `harnix password` or `harnix -passwd password`. A lone "-passwd" is a password; anything else is ignored.

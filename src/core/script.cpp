@@ -115,8 +115,9 @@ void ReadAndEvaluateScript(std::FILE* stream) {
     level->~Level();
 }
 
-void ReadScript(int count, char** words) {
-    if (count != 2) return Message(kError, "Invalid Syntax: %s \n", "read FileName");
+void ReadScript(const CommandRow& row, int count, char** words) {
+    // With a blank at the end that no other usage text has: logs hold it.
+    if (count != 2) return Message(kError, "Invalid Syntax: %s \n", row.usage);
     if (!RoomForAnotherLevel()) return Message(kError, "Scripts are nested too deeply to read: %s !\n", words[1]);
     std::FILE* file = OpenScript(words[1]);
     if (file == nullptr) return Message(kError, "Could not open file: %s !\n", words[1]);

@@ -3,8 +3,10 @@
 
 #include <cstdio>
 
+#include "core/command_table.h"
+
 // Until the end of the stream, a read error, or a command that asks to stop. Levels nest through the `read` command.
 void ReadAndEvaluateScript(std::FILE* stream);
 
 // The `read` command: runs the script that words[1] names.
-void ReadScript(int count, char** words);
+void ReadScript(const CommandRow& row, int count, char** words);

@@ -6,11 +6,14 @@
 
 #include "core/messages.h"
 #include "objects/memory.h"
+#include "objects/text_conversion.h"
 
 namespace {
 
 constexpr char kQuote = '"';
 constexpr char kComment = '#';
+
+static_assert(TextArgument::kTokenBufferSize == kLineSize, "as much as commands pass on of a word");
 
 // What a slot without a buffer holds.
 char empty_word[kLineSize];

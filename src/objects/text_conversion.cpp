@@ -126,6 +126,10 @@ bool TextArgument::Set(const char* word, long length, TextArea area) {
     return Pass(word);
 }
 
+bool TextArgument::SetWords(char** words, TextArea area) {
+    return Set(words[0], DecodeLong(words[1]), area);
+}
+
 bool TextArgument::SetBytes(const char* word, long length) {
     text_ = nullptr;
     length_ = static_cast<uint32_t>(length);

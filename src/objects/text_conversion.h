@@ -50,6 +50,8 @@ public:
     // Texts beside "null" that stand for a null pointer are for the caller to say: pass a null word then. False when
     // the command ends here (no memory, failed conversion): the message has been printed.
     bool Set(const char* word, long length, TextArea area);
+    // The text at words[0], its length at words[1].
+    bool SetWords(char** words, TextArea area = TextArea::four_times);
     // Bytes rather than a text: never converted, and "null" is no reserved word. A null word passes a null pointer.
     bool SetBytes(const char* word, long length);
 

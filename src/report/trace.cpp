@@ -2,6 +2,7 @@
 #include "report/trace.h"
 
 #include "core/messages.h"
+#include "report/return_code.h"
 
 namespace {
 
@@ -320,4 +321,9 @@ void outputOCI(int code, long rc, const char* name) {
         case Ending::plain: return Message(kOutput, "%s\n", row->function);
         case Ending::unended: return Message(kOutput, "%s", row->function);
     }
+}
+
+void TraceAndReport(int code, const char* name, void* error_handle, int rc) {
+    outputOCI(code, rc, name);
+    ReturnCodeReport(error_handle, rc);
 }
