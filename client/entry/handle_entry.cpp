@@ -142,8 +142,7 @@ Object* Freeable(std::span<const Maker> makers, const void* pointer, TypeCode ty
 sword Free(Object& object) noexcept {
     const SerialLock lock(object);
     if (object.InUse()) return EnterEnvironment(&object.Env(), [](Environment&) { return Error(kHandleInUse); });
-    Destroy(&object);
-    return OCI_SUCCESS;
+    return Destroy(&object) ? OCI_SUCCESS : OCI_INVALID_HANDLE;
 }
 
 }  // namespace

@@ -29,6 +29,8 @@ struct Writer {
     std::vector<std::unique_ptr<OwnedTable>> tables;    // the last is in use, the others are retired
     std::size_t living = 0;
     std::size_t occupied = 0;    // living or erased slots
+
+    [[nodiscard]] const Table& InUse() const { return tables.empty() ? kNoObjects : tables.back()->table; }
 };
 
 // Never destroyed: objects may be freed while the process ends.
@@ -48,6 +50,15 @@ void Put(const Table& table, Key key, Kind kind, std::size_t& occupied) {
     table.slots[index].key.store(key, std::memory_order_release);
 }
 
+// The slot of a key; null when the table has it not.
+Slot* FindSlot(const Table& table, Key key) {
+    for (std::size_t index = table.Home(key);; index = table.Next(index)) {
+        const Key found = table.slots[index].key.load(std::memory_order_relaxed);
+        if (found == key) return &table.slots[index];
+        if (found == kEmpty) return nullptr;
+    }
+}
+
 unsigned BitsFor(std::size_t living) {
     unsigned bits = kFirstBits;
     while ((std::size_t{1} << bits) < living * 4) ++bits;
@@ -59,13 +70,11 @@ void Rebuild(Writer& writer) {
     auto owned = std::make_unique<OwnedTable>(BitsFor(writer.living + 1));
     writer.tables.reserve(writer.tables.size() + 1);
     std::size_t occupied = 0;
-    if (!writer.tables.empty()) {
-        const Table& old = writer.tables.back()->table;
-        for (std::size_t index = 0; index <= old.mask; ++index) {
-            const Key key = old.slots[index].key.load(std::memory_order_relaxed);
-            if (key != kEmpty && key != kErased) {
-                Put(owned->table, key, old.slots[index].kind.load(std::memory_order_relaxed), occupied);
-            }
+    const Table& old = writer.InUse();
+    for (std::size_t index = 0; index <= old.mask; ++index) {
+        const Key key = old.slots[index].key.load(std::memory_order_relaxed);
+        if (key != kEmpty && key != kErased) {
+            Put(owned->table, key, old.slots[index].kind.load(std::memory_order_relaxed), occupied);
         }
     }
     writer.occupied = occupied;
@@ -86,35 +95,34 @@ void Insert(const void* pointer, Kind kind) {
 }
 
 void Retype(const void* pointer, Kind kind) noexcept {
-    const Key key = reinterpret_cast<Key>(pointer);
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
-    const Table& table = writer.tables.back()->table;
-    std::size_t index = table.Home(key);
-    while (table.slots[index].key.load(std::memory_order_relaxed) != key) index = table.Next(index);
-    table.slots[index].kind.store(kind, std::memory_order_release);
+    Slot* slot = FindSlot(writer.InUse(), reinterpret_cast<Key>(pointer));
+    if (slot) slot->kind.store(kind, std::memory_order_release);
 }
 
-void Erase(const void* pointer) noexcept {
-    const Key key = reinterpret_cast<Key>(pointer);
+bool Contains(const void* pointer) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
-    if (writer.tables.empty()) return;
-    const Table& table = writer.tables.back()->table;
-    std::size_t index = table.Home(key);
-    for (;; index = table.Next(index)) {
-        const Key found = table.slots[index].key.load(std::memory_order_relaxed);
-        if (found == kEmpty) return;
-        if (found == key) break;
-    }
-    table.slots[index].key.store(kErased, std::memory_order_release);
+    return FindSlot(writer.InUse(), reinterpret_cast<Key>(pointer)) != nullptr;
+}
+
+bool Erase(const void* pointer) noexcept {
+    Writer& writer = TheWriter();
+    const std::lock_guard lock(writer.mutex);
+    const Table& table = writer.InUse();
+    Slot* slot = FindSlot(table, reinterpret_cast<Key>(pointer));
+    if (!slot) return false;
+    slot->key.store(kErased, std::memory_order_release);
     --writer.living;
-    if (table.slots[table.Next(index)].key.load(std::memory_order_relaxed) != kEmpty) return;
+    auto index = static_cast<std::size_t>(slot - table.slots);
+    if (table.slots[table.Next(index)].key.load(std::memory_order_relaxed) != kEmpty) return true;
     // No search passes here any more: the erased slots that end this run become empty.
     for (; table.slots[index].key.load(std::memory_order_relaxed) == kErased; index = table.Previous(index)) {
         table.slots[index].key.store(kEmpty, std::memory_order_release);
         --writer.occupied;
     }
+    return true;
 }
 
 }  // namespace live

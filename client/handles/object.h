@@ -105,18 +105,21 @@ public:
     static void Unreserve(Environment& environment, void* memory) noexcept;
     // Hangs the object below its parent and makes it live. Throws std::bad_alloc and changes nothing then.
     static void Adopt(Object& object, Kind kind, std::size_t extra);
-    // Destroys the object and all below it; later, when another thread is inside a call.
-    static void Destroy(Object* object) noexcept;
+    // Destroys the object and all below it; later, when another thread is inside a call. False when another thread has
+    // done so meanwhile: it or what it hangs below.
+    static bool Destroy(Object* object) noexcept;
 
 private:
     friend class RetiredObjects;
+    // The next three hold, or are called under, the lock of the environment's tree.
+    static void Link(Object& object, Kind kind);
     static void Unlink(Object& object) noexcept;
-    static void Withdraw(Object& object) noexcept;
+    static bool Withdraw(Object& object) noexcept;
     static void DestroyTree(Object* object) noexcept;
 };
 
-// The set of living objects: a hash table from pointer to kind. KindOf takes no lock and reads nothing but the table; it
-// is inline, since every call of the library asks at least once.
+// The set of living objects: a hash table from pointer to kind. KindOf takes no lock and reads nothing but the table;
+// it is inline, since every call of the library asks at least once.
 namespace live {
 
 using Key = std::uintptr_t;
@@ -154,9 +157,11 @@ inline Kind KindOf(const void* pointer) noexcept {
     }
 }
 
-void Insert(const void* pointer, Kind kind);
-void Erase(const void* pointer) noexcept;
-void Retype(const void* pointer, Kind kind) noexcept;    // of a living object
+void Insert(const void* pointer, Kind kind);    // throws std::bad_alloc and changes nothing then
+bool Erase(const void* pointer) noexcept;       // false when it is not in the set
+// Nothing for an object that another thread has erased. As Kind::none an object stays in the set, but is not found.
+void Retype(const void* pointer, Kind kind) noexcept;
+bool Contains(const void* pointer) noexcept;    // of any kind, Kind::none too
 }  // namespace live
 
 // The living T behind a pointer, or null. T::kKind says its kind; Live<Object> takes any.
@@ -188,7 +193,7 @@ T* Create(Object& parent, TypeCode type, std::size_t extra, Arguments&&... argum
     return object;
 }
 
-inline void Destroy(Object* object) noexcept { ObjectTree::Destroy(object); }
+inline bool Destroy(Object* object) noexcept { return ObjectTree::Destroy(object); }
 
 // The pointer that the application gets: AsHandle<OCIStmt>(statement).
 template <class Handle>
