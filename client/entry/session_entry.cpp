@@ -19,7 +19,7 @@ constexpr int kBadText = 24501;
 constexpr int kNoPassword = 1005;
 constexpr int kNoNewPassword = 988;
 constexpr int kBadLogon = 1017;
-constexpr int kNotLoggedOn = 1012;
+constexpr int kNotConnected = 3114;
 
 constexpr ub4 kPasswordChangeLogsOn = OCI_AUTH;
 
@@ -160,7 +160,7 @@ Status VersionText(Object& object, std::string& text) {
         Status status = service->RequireServer(server);
         if (status.Failed()) return status;
     }
-    if (!server->Attached()) return Error(3114);
+    if (!server->Attached()) return Error(kNotConnected);
     text = server->Version();
     return {};
 }
@@ -178,10 +178,8 @@ sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
             return {};
         }
         if (!server) return InvalidHandle();
-        if (!server->Attached()) return Error(3114);
-        for (const Session* session : server->Sessions()) {
-            if (const std::shared_ptr<Link> link = session->ShareLink()) act(*link);
-        }
+        if (!server->Attached()) return Error(kNotConnected);
+        for (const std::shared_ptr<Link>& link : server->Links()) act(*link);
         return {};
     });
 }
@@ -230,8 +228,7 @@ sword OCISessionBegin(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4 creden
 sword OCISessionEnd(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4) {
     return Enter<ServiceContext>(svc, err, [&](ServiceContext&) {
         auto* session = Live<Session>(ses);
-        if (!session) return InvalidHandle();
-        return session->Begun() ? session->End() : Error(kNotLoggedOn);
+        return session ? session->End() : InvalidHandle();
     });
 }
 

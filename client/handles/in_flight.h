@@ -1,6 +1,6 @@
-// Calls in flight. A thread may free an object while another is inside a call that works on it: what is freed leaves the
-// set of living objects at once, so that no later call finds it, but is destroyed only when every call that was running
-// then has ended.
+// Calls in flight. A thread may free an object while another is inside a call that works on it: what is freed leaves
+// the set of living objects at once, so that no later call finds it, but is destroyed only when every call that was
+// running then has ended.
 //
 // Entering and leaving are plain stores into the thread's own slot; who frees pays for the ordering.
 #pragma once
@@ -31,8 +31,9 @@ extern const bool system_barrier;
 Slot& TakeSlot() noexcept;
 void DestroyRipe() noexcept;
 
-// Asked about an object that no call finds any more: true when no other thread is inside a call. Else the object is kept,
-// and destroyed by the thread that leaves last.
+// Asked about an object that no call finds any more: true when no other thread is inside a call. Else the object is
+// kept, and destroyed by the thread that leaves last. What leads to an object beside the set of living ones, such as a
+// server's list of its sessions, needs a lock that is held while the object is destroyed (SerialLock).
 bool MayDestroy(Object& object) noexcept;
 
 }  // namespace in_flight

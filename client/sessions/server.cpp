@@ -1,6 +1,7 @@
 // Server handles: attaching, detaching, connections for sessions.
 #include "sessions/server.h"
 
+#include <algorithm>
 #include <utility>
 
 #include "handles/attributes.h"
@@ -62,14 +63,21 @@ Server::~Server() { DropSessions(); }
 
 std::span<const AttributeRow> Server::Attributes() const { return kRows; }
 
-void Server::Join(Session& session) {
+void Server::Join(Session& session, const std::shared_ptr<Link>& link) {
     const std::lock_guard lock(mutex_);
-    sessions_.push_back(&session);
+    sessions_.push_back({&session, link});
 }
 
-void Server::Leave(Session& session) noexcept {
+void Server::Leave(const Session& session) noexcept {
     const std::lock_guard lock(mutex_);
-    std::erase(sessions_, &session);
+    std::erase_if(sessions_, [&session](const BegunSession& begun) { return begun.session == &session; });
+}
+
+std::vector<std::shared_ptr<Link>> Server::Links() const {
+    const std::lock_guard lock(mutex_);
+    std::vector<std::shared_ptr<Link>> links;
+    for (const BegunSession& begun : sessions_) links.push_back(begun.link);
+    return links;
 }
 
 Status Server::Attach(std::string_view database) {
@@ -97,15 +105,21 @@ Status Server::Detach() {
     return {};
 }
 
-Session* Server::AnySession() noexcept {
+Server::BegunSession Server::LastBegun() const {
     const std::lock_guard lock(mutex_);
-    return sessions_.empty() ? nullptr : sessions_.back();
+    return sessions_.empty() ? BegunSession() : sessions_.back();
+}
+
+bool Server::Joined(const Session& session) const {
+    const std::lock_guard lock(mutex_);
+    return std::any_of(sessions_.begin(), sessions_.end(),
+                       [&session](const BegunSession& begun) { return begun.session == &session; });
 }
 
 void Server::DropSessions() noexcept {
-    while (Session* session = AnySession()) {
-        session->Drop();
-        Leave(*session);
+    for (BegunSession begun = LastBegun(); begun.session; begun = LastBegun()) {
+        const SerialLock serial(begun.link->Serial());
+        if (Joined(*begun.session)) begun.session->Drop();    // else it is freed, or ended
     }
 }
 

@@ -13,6 +13,7 @@
 #include "handles/environment.h"
 #include "handles/object.h"
 
+class Link;
 class Session;
 
 class Server : public Object {
@@ -21,7 +22,7 @@ public:
     explicit Server(const Origin& origin, bool own = false) : Object(origin), own_(own) {}
     ~Server() override;
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
-    [[nodiscard]] bool InUse() const override { return own_ || !Sessions().empty(); }
+    [[nodiscard]] bool InUse() const override { return own_ || LastBegun().session; }
 
     [[nodiscard]] bool Attached() const { return Read(attached_); }
     [[nodiscard]] const std::string& Database() const { return database_; }    // change with attaching alone
@@ -34,9 +35,10 @@ public:
     Status TakeConnection(std::unique_ptr<engine::Connection>& connection);
     void GiveBack(std::unique_ptr<engine::Connection> connection) noexcept;
 
-    void Join(Session& session);
-    void Leave(Session& session) noexcept;
-    [[nodiscard]] std::vector<Session*> Sessions() const { return Read(sessions_); }    // begun and not ended
+    // Sessions that are begun and not ended, and their links.
+    void Join(Session& session, const std::shared_ptr<Link>& link);
+    void Leave(const Session& session) noexcept;
+    [[nodiscard]] std::vector<std::shared_ptr<Link>> Links() const;
 
     std::string internal_name;
     std::string external_name;
@@ -44,8 +46,15 @@ public:
     bool non_blocking = false;
 
 private:
+    // Another thread may free the session meanwhile; it holds the link's serial lock while it does.
+    struct BegunSession {
+        Session* session = nullptr;
+        std::shared_ptr<Link> link;
+    };
+
     void DropSessions() noexcept;
-    Session* AnySession() noexcept;
+    [[nodiscard]] BegunSession LastBegun() const;
+    [[nodiscard]] bool Joined(const Session& session) const;
     template <class T>
     T Read(const T& member) const {
         const std::lock_guard lock(mutex_);
@@ -58,5 +67,5 @@ private:
     std::string database_;
     std::string version_;
     std::unique_ptr<engine::Connection> spare_;
-    std::vector<Session*> sessions_;
+    std::vector<BegunSession> sessions_;
 };

@@ -63,13 +63,15 @@ Status Session::Begin(Server& server, const engine::Credentials& credentials) {
 Status Session::Adopt(Server& server, std::unique_ptr<engine::Connection> connection, std::string user_name) {
     auto link = std::make_shared<Link>(std::move(connection), Env().Threaded());
     link->user = std::move(user_name);
-    server.Join(*this);
+    const SerialLock serial(link->Serial());
+    server.Join(*this, link);
     server_ = &server;
     link_.Set(std::move(link));
     return {};
 }
 
 Status Session::End() {
+    const SerialLock serial(link_.Serial());    // the caller may hold that of another session
     if (!Begun()) return Error(kNotLoggedOn);
     Status status = GetLink()->Engine().Commit();
     if (!status.Failed()) Drop();
@@ -77,11 +79,13 @@ Status Session::End() {
 }
 
 void Session::Drop() noexcept {
-    const std::shared_ptr<Link> link = link_.Set(nullptr);
+    const SerialLock serial(link_.Serial());
+    const std::shared_ptr<Link> link = link_.Get();
     if (!link) return;
     std::unique_ptr<engine::Connection> connection = link->Close();
     Server* server = std::exchange(server_, nullptr);
     server->Leave(*this);
+    link_.Set(nullptr);    // last: who frees the session waits for the lock as long as it has a link
     if (connection->InTransaction() && connection->Rollback().Failed()) return;    // no use to anybody
     server->GiveBack(std::move(connection));
 }

@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <barrier>
 #include <thread>
 #include <vector>
 
@@ -119,6 +120,63 @@ TEST(ServerHandles, SessionsOfOneServerBeginAndEndInSeveralThreads) {
     for (std::thread& thread : threads) thread.join();
     EXPECT_EQ(failures, 0);
     EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+// What several threads do to the same handles at once: work(index), all let go together.
+template <class Work>
+void AtOnce(int count, Work work) {
+    std::barrier start(count);
+    std::vector<std::thread> threads;
+    for (int index = 0; index < count; ++index) {
+        threads.emplace_back([&, index] {
+            start.arrive_and_wait();
+            work(index);
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
+}
+
+TEST(FreedTwice, OneOfTheThreadsThatFreeAHandleDoes) {
+    const sb4 before = OCI_memGetMemCount();
+    Shared shared;
+    shared.Make();
+    for (int round = 0; round < 200; ++round) {
+        OCIServer* server = nullptr;
+        shared.New(server, OCI_HTYPE_SERVER);
+        std::atomic<int> freed{0};
+        AtOnce(3, [&](int) { freed += OCIHandleFree(server, OCI_HTYPE_SERVER) == OCI_SUCCESS; });
+        ASSERT_EQ(freed, 1) << "round " << round;
+    }
+    EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    EXPECT_EQ(OCI_memGetMemCount(), before);
+}
+
+TEST(ServerHandles, BrokenAndDetachedWhileASessionIsFreed) {
+    const sb4 before = OCI_memGetMemCount();
+    Shared shared;
+    shared.Make();
+    for (int round = 0; round < 200; ++round) {
+        OCIError* errors[3] = {};
+        for (OCIError*& error : errors) shared.New(error, OCI_HTYPE_ERROR);
+        OCIServer* server = nullptr;
+        OCISession* session = nullptr;
+        OCISvcCtx* svc = nullptr;
+        shared.New(server, OCI_HTYPE_SERVER);
+        shared.New(session, OCI_HTYPE_SESSION);
+        shared.New(svc, OCI_HTYPE_SVCCTX);
+        ASSERT_EQ(OCIServerAttach(server, shared.err, Text(":memory:"), 8, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, shared.err), OCI_SUCCESS);
+        ASSERT_EQ(OCISessionBegin(svc, shared.err, session, OCI_CRED_EXT, OCI_DEFAULT), OCI_SUCCESS);
+        AtOnce(3, [&](int index) {
+            if (index == 0) OCIHandleFree(session, OCI_HTYPE_SESSION);
+            if (index == 1) OCIBreak(server, errors[1]);
+            if (index == 2) OCIServerDetach(server, errors[2], OCI_DEFAULT);
+        });
+        EXPECT_EQ(OCIHandleFree(session, OCI_HTYPE_SESSION), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_SUCCESS);
+    }
+    EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    EXPECT_EQ(OCI_memGetMemCount(), before);
 }
 
 }  // namespace
