@@ -36,6 +36,7 @@ void ErrorList::List(const Status& status) noexcept try {
     const std::lock_guard lock(mutex_);
     records_.reserve(records_.size() + 2);
     const int alone = state_.exchange(kListed, std::memory_order_relaxed);
+    if (alone != kListed) records_.clear();    // what a thread listed while another emptied the list
     if (alone > 0) records_.push_back({alone, Status::kClient, {}});
     records_.push_back({status.Number(), status.Engine(), status.Detail()});
 } catch (const std::bad_alloc&) {
