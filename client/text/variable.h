@@ -26,10 +26,10 @@ public:
     Status Resize(std::uint32_t size);
 
 private:
-    // A block of so many bytes with the first `kept` of `content`.
+    // Takes a new block of `room` bytes for `content`, which fits and may be part of the old one.
     void Replace(std::uint32_t room, std::string_view content);
 
-    char* data_ = nullptr;    // null while the room is 0
+    char* data_ = nullptr;    // null until something is assigned
     std::uint32_t size_ = 0;
     std::uint32_t room_ = 0;
 };
