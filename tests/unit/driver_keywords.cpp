@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "core/keywords.h"
+#include "printed.h"
 
 namespace {
 
@@ -136,9 +137,9 @@ struct Decoded {
     std::string printed;
 };
 template <class Function> Decoded Decode(Function decode, const std::string& word, const KeywordTable* table) {
-    testing::internal::CaptureStdout();
-    const int value = decode(word.c_str(), table);
-    return {value, testing::internal::GetCapturedStdout()};
+    Decoded decoded;
+    decoded.printed = Printed([&] { decoded.value = decode(word.c_str(), table); });
+    return decoded;
 }
 
 const std::string kEmptyWord = "DecodeKeyword(): Null length token.\n";

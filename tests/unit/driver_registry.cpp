@@ -5,14 +5,9 @@
 
 #include "objects/buffers.h"
 #include "objects/registry.h"
+#include "printed.h"
 
 namespace {
-
-std::string Printed(auto&& action) {
-    testing::internal::CaptureStdout();
-    action();
-    return testing::internal::GetCapturedStdout();
-}
 
 int object_a, object_b;  // stand for what the library returned
 

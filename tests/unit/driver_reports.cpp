@@ -5,15 +5,14 @@
 #include <string>
 
 #include "core/command_table.h"
+#include "printed.h"
 #include "report/diagnostics.h"
 #include "report/trace.h"
 
 namespace {
 
 std::string Trace(int code, long rc, const char* name) {
-    testing::internal::CaptureStdout();
-    outputOCI(code, rc, name);
-    return testing::internal::GetCapturedStdout();
+    return Printed([&] { outputOCI(code, rc, name); });
 }
 
 TEST(Trace, OneFunctionOfEachLabel) {
@@ -84,7 +83,7 @@ TEST(Commands, TheFirstRowThatTheWordBegins) {
 }
 
 // Every word finds itself, or the earlier row that it begins; no two words share a code but exit and quit.
-TEST(Commands, WordsAndCodes) {
+TEST(Commands, NoTwoWordsShareACodeOrHideEachOther) {
     std::map<int, std::string> words;
     int rows = 0;
     for (const Command* row = kCommandTable; row->word != nullptr; ++row, ++rows) {

@@ -6,14 +6,9 @@
 
 #include "core/state.h"
 #include "objects/text_conversion.h"
+#include "printed.h"
 
 namespace {
-
-std::string Printed(auto&& action) {
-    testing::internal::CaptureStdout();
-    action();
-    return testing::internal::GetCapturedStdout();
-}
 
 std::string Wide(std::string_view text) {
     std::string wide;

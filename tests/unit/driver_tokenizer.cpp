@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "core/tokenizer.h"
+#include "printed.h"
 
 namespace {
 
@@ -23,9 +24,8 @@ Tokenized Split(const std::string& line, const std::string& left_over = "") {
     std::memcpy(buffer, left_over.c_str(), left_over.size() + 1);
     std::memcpy(buffer, line.c_str(), line.size() + 1);
     TokenVector tokens;
-    testing::internal::CaptureStdout();
-    const int count = Tokenize(buffer, buffer, tokens);
-    Tokenized result{{}, testing::internal::GetCapturedStdout()};
+    int count = 0;
+    Tokenized result{{}, Printed([&] { count = Tokenize(buffer, buffer, tokens); })};
     for (int index = 0; index < count; ++index) result.words.push_back(tokens.Words()[index]);
     return result;
 }
@@ -100,9 +100,8 @@ TEST(Tokenizer, ASlotKeepsItsBufferForLaterLines) {
     EXPECT_STREQ(room, "2nd");
     EXPECT_STREQ(room + 4, "t") << "the old contents stay behind the closing zero";
 
-    testing::internal::CaptureStdout();
-    tokens.StrAllocAndCopy(3, std::string(kLineSize, 'x').c_str());
-    EXPECT_EQ(testing::internal::GetCapturedStdout(), "StrAllocAndCopy(): inString len > MAX_BUFFER_SIZE !\n");
+    EXPECT_EQ(Printed([&] { tokens.StrAllocAndCopy(3, std::string(kLineSize, 'x').c_str()); }),
+              "StrAllocAndCopy(): inString len > MAX_BUFFER_SIZE !\n");
     EXPECT_STREQ(room, "2nd");
 }
 

@@ -12,6 +12,7 @@
 #include "objects/value_assignment.h"
 #include "objects/value_display.h"
 #include "oci.h"
+#include "printed.h"
 
 namespace {
 
@@ -30,16 +31,15 @@ struct Element {
 
     // What is printed; the guard must not have been touched.
     std::string Assign(const char* word, long given) {
-        testing::internal::CaptureStdout();
-        AssignText({type, data, size, &indicator, &length, &return_code, precision, scale}, word, given);
+        const ElementTarget target = {type, data, size, &indicator, &length, &return_code, precision, scale};
+        const std::string printed = Printed([&] { AssignText(target, word, given); });
         for (size_t index = size; index < sizeof data; ++index) EXPECT_EQ(data[index], 0xEE) << word << " at " << index;
-        return testing::internal::GetCapturedStdout();
+        return printed;
     }
     std::string Show() const {
-        testing::internal::CaptureStdout();
         Line line;
-        DisplayElement(line, {type, data, size, indicator, return_code, length, precision, scale, false});
-        return testing::internal::GetCapturedStdout();
+        const ElementView view = {type, data, size, indicator, return_code, length, precision, scale, false};
+        return Printed([&] { DisplayElement(line, view); });
     }
     std::string Bytes(size_t count) const { return {reinterpret_cast<const char*>(data), count}; }
 };

@@ -120,7 +120,7 @@ TEST(CodePages, TheShortWayAgreesWithTheLongOne) {
     }
 }
 
-TEST(CodePages, Refused) {
+TEST(CodePages, UnknownPagesAndNullAreasAreRefused) {
     char area[4];
     std::size_t unused_input = 0;
     std::size_t unused_output = 0;
