@@ -52,7 +52,8 @@ struct Session {
     OCIStmt* stmt = nullptr;
 
     explicit Session(const std::string& database) {
-        if (OCIEnvCreate(&env, OCI_DEFAULT, nullptr, nullptr, nullptr, nullptr, 0, nullptr) != OCI_SUCCESS) Fail("no environment");
+        if (OCIEnvCreate(&env, OCI_DEFAULT, nullptr, nullptr, nullptr, nullptr, 0, nullptr) != OCI_SUCCESS)
+            Fail("no environment");
         OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr);
         OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&stmt), OCI_HTYPE_STMT, 0, nullptr);
         Check(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, reinterpret_cast<const OraText*>(database.c_str()),
@@ -102,11 +103,14 @@ void FillBatch(std::vector<Buffer>& buffers, ub4 first) {
         const double price = static_cast<double>(id) * 1.25;
         std::memcpy(buffers[0].At(row), &id, sizeof id);
         std::memcpy(buffers[1].At(row), &price, sizeof price);
-        buffers[2].lengths[row] = static_cast<ub2>(std::snprintf(buffers[2].At(row), 20, "name of row %07d", static_cast<int>(id)));
-        const unsigned char day[7] = {120, 126, static_cast<unsigned char>(1 + id % 12), static_cast<unsigned char>(1 + id % 28), 1, 1, 1};
+        const int name_length = std::snprintf(buffers[2].At(row), 20, "name of row %07d", static_cast<int>(id));
+        buffers[2].lengths[row] = static_cast<ub2>(name_length);
+        const auto month = static_cast<unsigned char>(1 + id % 12);
+        const unsigned char day[7] = {120, 126, month, static_cast<unsigned char>(1 + id % 28), 1, 1, 1};
         std::memcpy(buffers[3].At(row), day, sizeof day);
         buffers[4].indicators[row] = id % 3 == 0 ? -1 : 0;
-        buffers[4].lengths[row] = static_cast<ub2>(std::snprintf(buffers[4].At(row), 40, "a note for row %d", static_cast<int>(id)));
+        const int note_length = std::snprintf(buffers[4].At(row), 40, "a note for row %d", static_cast<int>(id));
+        buffers[4].lengths[row] = static_cast<ub2>(note_length);
     }
 }
 
@@ -114,7 +118,8 @@ void Remove(const std::string& file) {
     for (const char* ending : {"", "-wal", "-shm", "-journal"}) fs::remove(file + ending);
 }
 
-const char* const kTable = "create table t(id integer, price number(12,2), name varchar2(20), day date, note varchar2(40))";
+const char* const kTable =
+    "create table t(id integer, price number(12,2), name varchar2(20), day date, note varchar2(40))";
 
 void InsertThroughLibrary(const std::string& file) {
     Session session(file);
@@ -124,9 +129,9 @@ void InsertThroughLibrary(const std::string& file) {
     for (ub4 position = 1; position <= buffers.size(); ++position) {
         Buffer& buffer = buffers[position - 1];
         OCIBind* bind = nullptr;
-        session.Check(OCIBindByPos(session.stmt, &bind, session.err, position, buffer.data.data(), buffer.size, buffer.type,
-                                   buffer.indicators.data(), buffer.type == SQLT_CHR ? buffer.lengths.data() : nullptr,
-                                   buffer.codes.data(), 0, nullptr, OCI_DEFAULT));
+        session.Check(OCIBindByPos(session.stmt, &bind, session.err, position, buffer.data.data(), buffer.size,
+                                   buffer.type, buffer.indicators.data(),
+                                   buffer.type == SQLT_CHR ? buffer.lengths.data() : nullptr, buffer.codes.data(), 0, nullptr, OCI_DEFAULT));
     }
     for (ub4 first = 0; first < kRows; first += kBatch) {
         FillBatch(buffers, first);
@@ -168,8 +173,8 @@ void InsertBare(const std::string& file) {
             std::memcpy(&id, buffers[0].At(row), sizeof id);
             std::memcpy(&price, buffers[1].At(row), sizeof price);
             const auto* date = reinterpret_cast<const unsigned char*>(buffers[3].At(row));
-            const int length = std::snprintf(day, sizeof day, "%02d%02d-%02d-%02d 00:00:00", date[0] - 100, date[1] - 100,
-                                             date[2], date[3]);
+            const int length = std::snprintf(day, sizeof day, "%02d%02d-%02d-%02d 00:00:00", date[0] - 100,
+                                             date[1] - 100, date[2], date[3]);
             sqlite3_bind_int64(query, 1, id);
             sqlite3_bind_double(query, 2, price);
             sqlite3_bind_text(query, 3, buffers[2].At(row), buffers[2].lengths[row], SQLITE_STATIC);
@@ -190,8 +195,9 @@ ub8 FetchThroughLibrary(Session& session) {
     for (ub4 position = 1; position <= buffers.size(); ++position) {
         Buffer& buffer = buffers[position - 1];
         OCIDefine* define = nullptr;
-        session.Check(OCIDefineByPos(session.stmt, &define, session.err, position, buffer.data.data(), buffer.size, buffer.type,
-                                     buffer.indicators.data(), buffer.lengths.data(), buffer.codes.data(), OCI_DEFAULT));
+        session.Check(OCIDefineByPos(session.stmt, &define, session.err, position, buffer.data.data(), buffer.size,
+                                     buffer.type, buffer.indicators.data(), buffer.lengths.data(),
+                                     buffer.codes.data(), OCI_DEFAULT));
     }
     session.Check(OCIStmtExecute(session.svc, session.stmt, session.err, 0, 0, nullptr, nullptr, OCI_DEFAULT));
     ub8 rows = 0;

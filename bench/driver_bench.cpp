@@ -45,7 +45,8 @@ double Seconds(const Command& command, const fs::path& input, const fs::path& ou
     words.push_back(nullptr);
     const auto start = std::chrono::steady_clock::now();
     pid_t child = 0;
-    if (posix_spawn(&child, words[0], &actions, nullptr, words.data(), environ) != 0) Fail("cannot start " + command[0]);
+    if (posix_spawn(&child, words[0], &actions, nullptr, words.data(), environ) != 0)
+        Fail("cannot start " + command[0]);
     int status = 0;
     waitpid(child, &status, 0);
     const auto end = std::chrono::steady_clock::now();
@@ -102,10 +103,12 @@ void MakeTable(const fs::path& file) {
     const char* sql =
         "create table t(id integer, price number(12,2), name varchar2(20), day date, note varchar2(40));"
         "with recursive n(i) as (select 1 union all select i + 1 from n where i < 200000)"
-        "insert into t select i, i * 1.25, printf('name of row %08d', i), datetime('2026-01-01', '+' || (i % 3650) || ' days'),"
+        "insert into t select i, i * 1.25, printf('name of row %08d', i),"
+        "datetime('2026-01-01', '+' || (i % 3650) || ' days'),"
         "case when i % 3 = 0 then null else 'a note for row ' || i end from n";
     char* error = nullptr;
-    if (sqlite3_open(file.c_str(), &database) != SQLITE_OK || sqlite3_exec(database, sql, nullptr, nullptr, &error) != SQLITE_OK)
+    if (sqlite3_open(file.c_str(), &database) != SQLITE_OK ||
+        sqlite3_exec(database, sql, nullptr, nullptr, &error) != SQLITE_OK)
         Fail(error ? error : "cannot make the table");
     sqlite3_close(database);
 }
@@ -141,10 +144,10 @@ void Feed(int descriptor, const std::string& commands, const fs::path& mark) {
 
 std::string MixedCommands(int count) {
     static const char* const kMixed[] = {
-        "# a comment", "setcallerroroci 1", "getmemoci null buf sqlt_str 20 10", "updatememoci buf 3 text 4", "listoci null buf",
-        "freememoci buf", "ocihandlealloc env stmt oci_htype_stmt",
-        "ocistmtprepare stmt err \"select :a from dual\" 19 oci_ntv_syntax oci_default", "ocihandlefree stmt oci_htype_stmt",
-        "ocihandlefree nothing oci_htype_stmt", "ociping svc err oci_default", "ocinumberadd err 12 30", "nonsense"};
+        "# a comment", "setcallerroroci 1", "getmemoci null buf sqlt_str 20 10", "updatememoci buf 3 text 4",
+        "listoci null buf", "freememoci buf", "ocihandlealloc env stmt oci_htype_stmt",
+        "ocistmtprepare stmt err \"select :a from dual\" 19 oci_ntv_syntax oci_default",
+        "ocihandlefree stmt oci_htype_stmt", "ocihandlefree nothing oci_htype_stmt", "ociping svc err oci_default", "ocinumberadd err 12 30", "nonsense"};
     std::string text;
     for (int i = 0; i < count; ++i) text.append(kMixed[static_cast<size_t>(i) % std::size(kMixed)]).append("\n");
     return text;
@@ -182,14 +185,17 @@ void Run(const Bench& bench) {
     const fs::path nothing = Script(bench, "nothing", [](std::ofstream&) {});
     const int million = 1000000;
 
-    const fs::path comments = Repeated(bench, "comments", "", "# a comment line of a script, as long as such lines are", million);
-    Pair(bench, "one million comment lines / read, prompt, echo", 1.3, {{harnix}, comments}, {{baselines, "echo"}, comments});
+    const fs::path comments =
+        Repeated(bench, "comments", "", "# a comment line of a script, as long as such lines are", million);
+    Pair(bench, "one million comment lines / read, prompt, echo", 1.3, {{harnix}, comments},
+         {{baselines, "echo"}, comments});
 
     const fs::path switches = Repeated(bench, "switches", "", "setcallerroroci 1", million);
-    Pair(bench, "one million setcallerroroci / read, prompt, echo, result", 1.5, {{harnix}, switches}, {{baselines, "result"}, switches});
+    Pair(bench, "one million setcallerroroci / read, prompt, echo, result", 1.5, {{harnix}, switches},
+         {{baselines, "result"}, switches});
 
-    const fs::path sums = Repeated(bench, "sums", "ocienvcreate env oci_default\nocihandlealloc env err oci_htype_error\n",
-                                   "ocinumberadd err 12 30", million);
+    const char* const make_error_handle = "ocienvcreate env oci_default\nocihandlealloc env err oci_htype_error\n";
+    const fs::path sums = Repeated(bench, "sums", make_error_handle, "ocinumberadd err 12 30", million);
     Pair(bench, "one million ocinumberadd / the same writes", 2.0, {{harnix}, sums}, {{baselines, "trace"}, sums});
 
     const fs::path file = bench.folder / "rows.db";
@@ -199,11 +205,13 @@ void Run(const Bench& bench) {
             << "ocistmtprepare stmt err \"select id, price, name, day, note from t\" 41 oci_ntv_syntax oci_default\n"
             << "ocistmtexecute svc stmt err 0 0 oci_default\nfetchalloci stmt\n";
     });
-    Pair(bench, "FetchAllOCI of 200,000 x 5 / bare engine loop", 1.5, {{harnix}, fetch}, {{baselines, "sqlite", file}, nothing});
+    Pair(bench, "FetchAllOCI of 200,000 x 5 / bare engine loop", 1.5, {{harnix}, fetch},
+         {{baselines, "sqlite", file}, nothing});
 
     Bench often = bench;
     often.runs = 101;
-    Pair(often, "start to first prompt / an empty program", 3.0, {{harnix}, nothing}, {{bench.binaries / "empty"}, nothing});
+    Pair(often, "start to first prompt / an empty program", 3.0, {{harnix}, nothing},
+         {{bench.binaries / "empty"}, nothing});
     Memory(bench);
 }
 
