@@ -131,7 +131,8 @@ void InsertThroughLibrary(const std::string& file) {
         OCIBind* bind = nullptr;
         session.Check(OCIBindByPos(session.stmt, &bind, session.err, position, buffer.data.data(), buffer.size,
                                    buffer.type, buffer.indicators.data(),
-                                   buffer.type == SQLT_CHR ? buffer.lengths.data() : nullptr, buffer.codes.data(), 0, nullptr, OCI_DEFAULT));
+                                   buffer.type == SQLT_CHR ? buffer.lengths.data() : nullptr,
+                                   buffer.codes.data(), 0, nullptr, OCI_DEFAULT));
     }
     for (ub4 first = 0; first < kRows; first += kBatch) {
         FillBatch(buffers, first);

@@ -1,6 +1,6 @@
 // What a user of the driver would notice, each beside the same work done by hand (baselines.cpp) in the same run: lines
-// interpreted, rows fetched and printed, start-up, memory over a long script. Prints a line a measure: the median of the
-// paired ratios and the goal.
+// interpreted, rows fetched and printed, start-up, memory over a long script. Prints a line a measure: the median of
+// the paired ratios and the goal.
 //   driver_bench BIN_DIR [runs]
 #include <fcntl.h>
 #include <spawn.h>
@@ -147,7 +147,8 @@ std::string MixedCommands(int count) {
         "# a comment", "setcallerroroci 1", "getmemoci null buf sqlt_str 20 10", "updatememoci buf 3 text 4",
         "listoci null buf", "freememoci buf", "ocihandlealloc env stmt oci_htype_stmt",
         "ocistmtprepare stmt err \"select :a from dual\" 19 oci_ntv_syntax oci_default",
-        "ocihandlefree stmt oci_htype_stmt", "ocihandlefree nothing oci_htype_stmt", "ociping svc err oci_default", "ocinumberadd err 12 30", "nonsense"};
+        "ocihandlefree stmt oci_htype_stmt", "ocihandlefree nothing oci_htype_stmt", "ociping svc err oci_default",
+        "ocinumberadd err 12 30", "nonsense"};
     std::string text;
     for (int i = 0; i < count; ++i) text.append(kMixed[static_cast<size_t>(i) % std::size(kMixed)]).append("\n");
     return text;

@@ -32,7 +32,8 @@ sword OCIArrayDescriptorAlloc(CONST dvoid *parent, dvoid **array, ub4 type, ub4 
 sword OCIArrayDescriptorFree(dvoid **array, ub4 type);
 
 /* Error records (recordno counts from 1; OCI_NO_DATA after the last), versions, breaking a running call.
-   `sqlstate` has room for 6 bytes. */
+   Five characters are stored at `sqlstate`, 10 bytes in a UTF-16 environment, without a terminator; callers give room
+   for one. Null skips an output. A text that `bufsize` bytes do not hold is cut, and the answer OCI_ERROR. */
 sword OCIErrorGet(dvoid *hndl, ub4 recordno, OraText *sqlstate, sb4 *code, OraText *buf, ub4 bufsize, ub4 type);
 sword OCIServerVersion(dvoid *hndl, OCIError *err, OraText *buf, ub4 bufsize, ub1 type);
 void OCIClientVersion(sword *major, sword *minor, sword *update, sword *patch, sword *port);

@@ -265,9 +265,9 @@ template <bool kNegative>
     return ((w0 - (1ull << 56)) | (w0 + Repeat(28)) | w1 | (w1 + Repeat(28)) | w2 | (w2 + Repeat(28))) & kHighBits;
 }
 
-// Writes normalized digits, of which the last four are 0, as a number of that sign; the exponent fits. A carry out of the
-// first digit, 0 or 1, goes in front of them, and the last of 20 digits leaves: the words are stored a byte further on,
-// each over the end of the one behind it.
+// Writes normalized digits, of which the last four are 0, as a number of that sign; the exponent fits. A carry out of
+// the first digit, 0 or 1, goes in front of them, and the last of 20 digits leaves: the words are stored a byte further
+// on, each over the end of the one behind it.
 template <bool kNegative>
 [[gnu::always_inline]] inline void Encode(const Digits& digits, unsigned carry, OCINumber* result) {
     using namespace detail;
