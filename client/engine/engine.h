@@ -83,6 +83,7 @@ struct Dialect {
     bool has_minus = false;                  // whether "minus select" is; "except" where it is not
     bool has_for_update = false;             // whether "for update" is; cut off where it is not
     bool has_date_literals = false;          // whether date '...' and timestamp '...' are; plain texts where not
+    bool has_truncate = false;               // whether "truncate table" is; "delete from" where it is not
 };
 
 struct Credentials {

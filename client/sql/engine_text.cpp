@@ -110,6 +110,9 @@ private:
             Replace(token, token.End(), named ? "(select 'X' as dummy)" : "(select 'X' as dummy) as dual");
         } else if (token.Is("minus") && At(tokens_, index + 1).Is("select") && !dialect_.has_minus) {
             Replace(token, token.End(), "except");
+        } else if (token.Is("truncate") && index == 0 && At(tokens_, 1).Is("table") && !dialect_.has_truncate) {
+            Replace(token, tokens_[1].End(), "delete from");
+            return index + 2;
         } else if (token.Is("for") && step_.locks_rows && !dialect_.has_for_update && open_.empty() &&
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);

@@ -82,6 +82,18 @@ TEST_F(Executing, TheMomentInDefaultsAndLists) {
     }
 }
 
+TEST_F(Executing, TruncateEmptiesTheTableForGood) {
+    MustRun("create table t(a number)");
+    MustRun("insert into t values(1)");
+    ASSERT_EQ(Prepare("truncate table t"), 0);
+    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_STMT_TYPE), 0);
+    EXPECT_EQ(Execute(), 0);
+    MustRun("rollback");
+    EXPECT_EQ(One("select count(*) from t"), "0");
+    ASSERT_EQ(Prepare("truncate table missing"), 0);
+    EXPECT_EQ(Execute(), 942);
+}
+
 TEST_F(Executing, ParseOnlyRunsNothingAndComesFirst) {
     MustRun("create table t(a number)");
     ASSERT_EQ(Prepare("insert into t values(1)"), 0);

@@ -148,7 +148,7 @@ std::string SqliteConnection::ServerVersion() {
 }
 
 const Dialect& SqliteConnection::GetDialect() const {
-    static constexpr Dialect kDialect{'?', kTypes, kMoments, kCasts, false, false, false};
+    static constexpr Dialect kDialect{'?', kTypes, kMoments, kCasts, false, false, false, false, false};
     return kDialect;
 }
 

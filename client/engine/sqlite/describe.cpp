@@ -109,8 +109,8 @@ void DescribeItem(const SelectItem& item, Column& column, bool& typed) {
         column.scale = 0;
         column.nullable = false;
         typed = true;
-    } else if (!item.cast_type.empty()) {
-        typed = ReadDeclaredType(item.cast_type, column);
+    } else if (!item.type.empty()) {
+        typed = ReadDeclaredType(item.type, column);
     }
 }
 

@@ -1,4 +1,5 @@
-// The SQL functions that this engine adds: casts that SQLite would do another way, and the time with its zone.
+// The SQL functions that this engine adds: casts that SQLite would do another way, the time with its zone, and those of
+// the dialect.
 #pragma once
 
 #include <sqlite3.h>
@@ -37,5 +38,12 @@ inline constexpr Dialect::Spelling kMoments[] = {
 };
 
 Status AddFunctions(sqlite3* database);
+
+// What a call of a function answers: the declared type, or the argument, from 1, whose type it has.
+struct ResultType {
+    std::string_view declared;
+    int like = 0;
+};
+ResultType FunctionResult(std::string_view name);
 
 }  // namespace engine::sqlite

@@ -20,11 +20,17 @@ bool ClosesLast(const std::vector<std::string_view>& pieces, std::size_t open) {
     return false;
 }
 
-// The type of sysdate and its like, whose engine text is (F()).
-std::string_view MomentType(const std::vector<std::string_view>& pieces) {
-    if (pieces.size() != 5 || pieces[0] != "(") return {};
-    if (IsWord(pieces[1], "kelp_sysdate")) return "date";
-    return IsWord(pieces[1], "kelp_systimestamp") ? "timestamp_tz" : "";
+// The argument, from 1, of the call whose parenthesis stands at pieces[1].
+std::vector<std::string_view> Argument(const std::vector<std::string_view>& pieces, int position) {
+    std::vector<std::string_view> argument;
+    int depth = 0;
+    for (std::size_t index = 1; index + 1 < pieces.size(); ++index) {
+        if (pieces[index] == "(") ++depth;
+        if (pieces[index] == ")") --depth;
+        if (depth == 1 && pieces[index] == ",") --position;
+        else if (position == 1 && index > 1) argument.push_back(pieces[index]);
+    }
+    return argument;
 }
 
 // cast(e as T(a, b)), or F(e, a, b) of a function that casts.
@@ -47,6 +53,18 @@ std::string CastType(const std::vector<std::string_view>& pieces) {
     return by_function ? std::string(cast->written) : std::string();
 }
 
+// The type of an expression as a declaration; empty when its text does not tell. sysdate and its like are (F()).
+std::string TypeOf(std::vector<std::string_view> pieces) {
+    for (;;) {
+        if (pieces.size() == 5 && pieces[0] == "(") pieces = {pieces.begin() + 1, pieces.end() - 1};
+        if (std::string type = CastType(pieces); !type.empty()) return type;
+        if (pieces.size() < 3 || pieces[1] != "(" || !ClosesLast(pieces, 1)) return {};
+        const ResultType result = FunctionResult(pieces[0]);
+        if (result.like == 0) return std::string(result.declared);
+        pieces = Argument(pieces, result.like);
+    }
+}
+
 SelectItem ReadItem(std::string_view text) {
     std::vector<std::string_view> pieces = Split(text);
     SelectItem item;
@@ -54,8 +72,7 @@ SelectItem ReadItem(std::string_view text) {
     if (item.has_alias) pieces.resize(pieces.size() - 2);
     item.is_row_id = !pieces.empty() && IsWord(pieces.back(), "rowid") &&
                      (pieces.size() == 1 || (pieces.size() == 3 && pieces[1] == "."));
-    item.cast_type = MomentType(pieces);
-    if (item.cast_type.empty()) item.cast_type = CastType(pieces);
+    item.type = TypeOf(std::move(pieces));
     return item;
 }
 
