@@ -132,6 +132,9 @@ ByKind<Function> ForColumn(const ByOrigin<Function>& row, ColumnClass column) {
 int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter>& converters, Workspace& workspace,
           const engine::Datum& datum);
 
+// An error of the number package as that of a conversion.
+int AsConversionError(int error);
+
 // UTF-8 in the application's form: itself, or UTF-16 in the workspace.
 int ToApplication(std::string_view utf8, Workspace& workspace, std::string_view& text);
 

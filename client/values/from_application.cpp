@@ -90,7 +90,8 @@ std::int64_t ReadAs(const char* at) {
 template <std::size_t size>
 int FromDecimal(const Source& source, Workspace& workspace, Datum& datum) {
     OCINumber number;
-    if (number::FromDecimalFloat(source.at, size, &number) != 0) return kInvalidNumber;
+    const int error = AsConversionError(number::FromDecimalFloat(source.at, size, &number));
+    if (error != 0) return error;
     return SetNumber(number, workspace, datum);
 }
 

@@ -13,17 +13,6 @@ namespace {
 
 using engine::Datum;
 
-// Errors of the number package as those of a conversion.
-int AsConversionError(int error) {
-    switch (error) {
-        case 0: return 0;
-        case number::kOverflow:
-        case number::kUnderflow:
-        case number::kNumericOverflow: return kNumericOverflow;
-        default: return kInvalidNumber;
-    }
-}
-
 int NumberOfInteger(const Datum& datum, Workspace&, OCINumber& number) {
     number::FromInt64(datum.integer, &number);
     return 0;
@@ -157,6 +146,16 @@ constexpr ByOrigin<OutConverter> kIntegerRow =
          IntegerOfNumber<Integer, NumberOfText>, IntegerOfBinaryReal<Integer>>;
 
 }  // namespace
+
+int AsConversionError(int error) {
+    switch (error) {
+        case 0: return 0;
+        case number::kOverflow:
+        case number::kUnderflow:
+        case number::kNumericOverflow: return kNumericOverflow;
+        default: return kInvalidNumber;
+    }
+}
 
 const ByOrigin<OutConverter> kToNum = kNumberRow<PutNum>;
 const ByOrigin<OutConverter> kToPdn = kNumberRow<PutPdn>;

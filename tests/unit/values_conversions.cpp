@@ -275,6 +275,8 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"},
         {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"},
         {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
+        {Raw(ub8{698} << 53 | 1), SQLT_BFLOAT, -1, "!1426"},    // 1E300
+        {Raw(ub8{0x78} << 56), SQLT_BFLOAT, -1, "!1426"}, {Raw(ub8{0x7C} << 56), SQLT_BFLOAT, -1, "!1722"},
         {std::string(8, '\0'), SQLT_CLOB, -1, "!932"}, {std::string(8, '\0'), SQLT_CUR, -1, "!932"},
         {std::string(8, '\0'), SQLT_RDD, -1, "!21710"},
     };
