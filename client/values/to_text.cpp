@@ -151,7 +151,7 @@ View ModelOf(ColumnClass column) {
     }
 }
 
-// In the default model of the column's type; what is no date stays as it is.
+// In the default model of the column's type; what is no date, a time alone included, stays as it is.
 int DateText(const Datum& datum, Workspace& workspace, View& text) {
     constexpr std::size_t kShortDate = 9;
     const View model = ModelOf(workspace.column);
@@ -161,7 +161,7 @@ int DateText(const Datum& datum, Workspace& workspace, View& text) {
         return 0;
     }
     date::DateTime value;
-    if (date::FromEngineText(datum.Text(), &value) != 0) return OwnText(datum, workspace, text);
+    if (date::FromEngineText(datum.Text(), &value) != 0 || value.month == 0) return OwnText(datum, workspace, text);
     std::size_t length = 0;
     const auto scope = workspace.column == ColumnClass::date ? date::Scope::date : date::Scope::timestamp;
     const int error = date::ToText(value, model, date::kEnglish, scope, begin, workspace.small.size(), &length);

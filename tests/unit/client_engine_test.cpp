@@ -330,6 +330,7 @@ TEST_F(EngineTest, FunctionsOfDatesNumbersAndText) {
         {"add_months('2024-01-31 10:00:00', 1), add_months('2024-02-29', -12)",
          "time 2024-02-29 10:00:00,time 2023-02-28 00:00:00;"},
         {"add_months('2024-01-31', 1000000)", "error 1841"}, {"add_months(5, 1)", "error 932"},
+        {"add_months('10:00:00', 1)", "error 932"},
         {"months_between('2024-03-31', '2024-02-29'), months_between('2024-01-01', '2024-02-17'),"
          " months_between('0001-01-05', '-0001-01-05')", "1,decimal -1.51612903225806451612903225806451612903,12;"},
         {"last_day('2024-02-01 01:02:03'), next_day('2024-02-09', 'friday'), next_day('2024-02-09', 1)",

@@ -241,6 +241,20 @@ TEST_F(Conversions, DatetimeDescriptors) {
     EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!21710") << "freed";
 }
 
+TEST_F(Conversions, ATimeAloneIsNoDate) {
+    auto* time = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIME);
+    ASSERT_EQ(OCI_datetimeSetTime(env, err, time, 10, 20, 30, 0), OCI_SUCCESS);
+    EXPECT_EQ(In(Raw(time), SQLT_TIME, ":1"), "10:20:30");
+    MustRun("create table moments(d date, t timestamp)");
+    for (const char* column : {"d", "t"}) {
+        ASSERT_EQ(Prepare("insert into moments(" + std::string(column) + ") values(:1)"), 0);
+        ASSERT_EQ(Bind(1, {&time, sizeof time, SQLT_TIME}), 0);
+        EXPECT_NE(Execute(), 0) << column;
+    }
+    EXPECT_EQ(One("select count(*) from moments"), "0");
+    EXPECT_EQ(One("select cast('10:20:30' as timestamp) from dual"), "0000-00-00 10:20:30") << "as it is";
+}
+
 TEST_F(Conversions, StringsAndRaws) {
     OCIString* string = nullptr;
     OCIRaw* raw = nullptr;

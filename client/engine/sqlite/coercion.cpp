@@ -82,6 +82,9 @@ int HexDigit(char c) {
     return -1;
 }
 
+// Of texts in the engine's form: no year is written with two digits.
+bool IsTimeAlone(std::string_view text) { return text.size() > 2 && text[2] == ':'; }
+
 // The default model of the type, else the form in which dates are kept.
 int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
     if (date::FromEngineText(text, &value) == 0 && value.month != 0) return 0;
@@ -245,7 +248,7 @@ Status Coercion::ApplyDate(Datum& value) {
     constexpr std::size_t kPlainDate = 19;    // "YYYY-MM-DD HH:MM:SS"
     const std::string_view text = value.Text();
     const bool as_it_is = purpose_ == Purpose::compare || column_.type != SQLT_DAT || text.size() == kPlainDate;
-    if (value.kind == Kind::timestamp && as_it_is) return {};
+    if (value.kind == Kind::timestamp && as_it_is && !IsTimeAlone(text)) return {};
     if (text.empty()) {
         value = {};
         return {};

@@ -101,7 +101,7 @@ void ReturnDate(sqlite3_context* context, const date::DateTime& value) {
 int ReadDate(sqlite3_value* value, date::DateTime& result) {
     if (sqlite3_value_type(value) != SQLITE_TEXT) return kInconsistentTypes;
     const int failure = date::FromEngineText(TextOf(value), &result);
-    if (failure == 0) return 0;
+    if (failure == 0) return result.month != 0 ? 0 : kInconsistentTypes;
     const int by_model = date::FromText(TextOf(value), date::kDateModel, date::kEnglish, date::Scope::date, &result);
     return by_model != 0 && failure != date::kBadText ? failure : by_model;
 }
