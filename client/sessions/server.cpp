@@ -63,6 +63,11 @@ Server::~Server() { DropSessions(); }
 
 std::span<const AttributeRow> Server::Attributes() const { return kRows; }
 
+bool Server::Attached() const {
+    const std::lock_guard lock(mutex_);
+    return attached_;
+}
+
 void Server::Join(Session& session, const std::shared_ptr<Link>& link) {
     const std::lock_guard lock(mutex_);
     sessions_.push_back({&session, link});

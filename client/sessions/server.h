@@ -24,7 +24,7 @@ public:
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
     [[nodiscard]] bool InUse() const override { return own_ || LastBegun().session; }
 
-    [[nodiscard]] bool Attached() const { return Read(attached_); }
+    [[nodiscard]] bool Attached() const;
     [[nodiscard]] const std::string& Database() const { return database_; }    // change with attaching alone
     [[nodiscard]] const std::string& Version() const { return version_; }
 
@@ -55,11 +55,6 @@ private:
     void DropSessions() noexcept;
     [[nodiscard]] BegunSession LastBegun() const;
     [[nodiscard]] bool Joined(const Session& session) const;
-    template <class T>
-    T Read(const T& member) const {
-        const std::lock_guard lock(mutex_);
-        return member;
-    }
 
     const bool own_;    // made by a logon and below its service context
     mutable std::mutex mutex_;    // of what follows; nothing else is locked or called while it is held

@@ -1,5 +1,6 @@
 // The thread package: mutexes, keys, identifiers, handles and threads. Everything here may be used from any thread at
-// any time; destroying an object that another thread is about to use is the application's mistake.
+// any time: an object that is destroyed while another thread is in a call on it lives until that call has ended. A held
+// mutex that goes with its environment leaves those who wait for it waiting.
 #pragma once
 
 #include <atomic>

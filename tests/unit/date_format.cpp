@@ -4,16 +4,11 @@
 #include <random>
 
 #include "date/format.h"
+#include "date_reading.h"
 
 namespace {
 
 using namespace date;
-
-DateTime Read(std::string_view text) {
-    DateTime value;
-    EXPECT_EQ(FromEngineText(text, &value), 0) << text;
-    return value;
-}
 
 // The text, or the error's number.
 std::string Show(const DateTime& value, std::string_view model, const char* language = "english",

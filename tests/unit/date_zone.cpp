@@ -9,16 +9,11 @@
 
 #include "date/zone.h"
 #include "date/zone_rules.h"
+#include "date_reading.h"
 
 namespace {
 
 using namespace date;
-
-DateTime Read(std::string_view text) {
-    DateTime value;
-    EXPECT_EQ(FromEngineText(text, &value), 0) << text;
-    return value;
-}
 
 TEST(Zone, OffsetsByTheirText) {
     const struct { const char* zone; int minutes; Errno number; } cases[] = {
