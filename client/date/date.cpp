@@ -4,6 +4,7 @@
 
 #include <ctime>
 
+#include "handles/errors.h"
 #include "oci_constants.h"
 
 namespace date {
@@ -79,18 +80,18 @@ Flags CheckTime(const DateTime& value) noexcept {
 }
 
 Errno ValidateDate(const DateTime& value) noexcept {
-    if (value.year < kMinYear || value.year > kMaxYear || value.year == 0) return kBadYear;
-    if (value.month < 1 || value.month > 12) return kBadMonth;
-    if (value.day < 1 || value.day > 31) return kBadDay;
-    if (value.day > 28 && value.day > DaysInMonth(value.year, value.month)) return kBadDayForMonth;
-    return IsMissing(value.year, value.month, value.day) ? kNotInCalendar : 0;
+    if (value.year < kMinYear || value.year > kMaxYear || value.year == 0) return errors::kBadYear;
+    if (value.month < 1 || value.month > 12) return errors::kBadMonth;
+    if (value.day < 1 || value.day > 31) return errors::kBadDay;
+    if (value.day > 28 && value.day > DaysInMonth(value.year, value.month)) return errors::kBadDayForMonth;
+    return IsMissing(value.year, value.month, value.day) ? errors::kNotInCalendar : 0;
 }
 
 Errno ValidateTime(const DateTime& value) noexcept {
-    if (value.hour > 23) return kBadHour;
-    if (value.minute > 59) return kBadMinute;
-    if (value.second > 59) return kBadSecond;
-    return value.nanosecond > 999'999'999 ? kBadFraction : 0;
+    if (value.hour > 23) return errors::kBadHour;
+    if (value.minute > 59) return errors::kBadMinute;
+    if (value.second > 59) return errors::kBadSecond;
+    return value.nanosecond > 999'999'999 ? errors::kBadFraction : 0;
 }
 
 Errno Validate(const DateTime& value) noexcept {
@@ -128,7 +129,7 @@ int DayOfYear(const DateTime& value) noexcept { return ToDayNumber(value) - ToDa
 Errno AddDays(const DateTime& value, std::int64_t days, DateTime* result) noexcept {
     if (const Errno number = Validate(value)) return number;
     const DayNumber day = ToDayNumber(value);
-    if (days < kMinDay - day || days > kMaxDay - day) return kBadYear;
+    if (days < kMinDay - day || days > kMaxDay - day) return errors::kBadYear;
     *result = value;
     FromDayNumber(day + static_cast<DayNumber>(days), result);
     return 0;
@@ -138,7 +139,7 @@ Errno AddDays(const DateTime& value, std::int64_t days, DateTime* result) noexce
 Errno AddMonths(const DateTime& value, std::int64_t months, DateTime* result) noexcept {
     if (const Errno number = Validate(value)) return number;
     int year = 0, month = 0;
-    if (!MoveMonths(value, months, &year, &month)) return kBadYear;
+    if (!MoveMonths(value, months, &year, &month)) return errors::kBadYear;
     const int last_day = DaysInMonth(year, month);
     int day = value.day;
     if (day > last_day || day == DaysInMonth(value.year, value.month)) day = last_day;

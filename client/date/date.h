@@ -17,18 +17,6 @@ namespace date {
 
 using Errno = int;    // a published error number; 0: success
 
-constexpr Errno kBadDayForMonth = 1839;
-constexpr Errno kBadYear = 1841;            // also a result before the year -4712 or after 9999
-constexpr Errno kBadMonth = 1843;
-constexpr Errno kBadWeekday = 1846;
-constexpr Errno kBadDay = 1847;
-constexpr Errno kBadHour = 1850;
-constexpr Errno kBadMinute = 1851;
-constexpr Errno kBadSecond = 1852;
-constexpr Errno kNotInCalendar = 1864;      // a day that the calendar does not have: 5 to 14 October 1582
-constexpr Errno kBadFraction = 1880;
-constexpr Errno kBadText = 1861;            // a text that is not of the form wanted
-
 constexpr int kMinYear = -4712;
 constexpr int kMaxYear = 9999;
 

@@ -2,13 +2,10 @@
 #include "date/descriptor.h"
 
 #include "date/zone.h"
+#include "handles/errors.h"
 #include "oci_constants.h"
 
 namespace {
-
-constexpr int kInvalidDateTime = 1866;
-constexpr int kNotComparable = 1870;
-constexpr int kNoSuchField = 1878;
 
 // The general type has the number of an interval: all parts, with a zone when one is given.
 constexpr TypeCode kGeneralType = OCI_DTYPE_INTERVAL_YM;
@@ -65,7 +62,7 @@ Status DateTimeDescriptor::Construct(const date::DateTime& fields, std::string_v
 Status DateTimeDescriptor::Store(const date::DateTime& given) {
     date::DateTime value = given;
     const Zone rule = ZoneRule();
-    if (HasDate() && value.month == 0) return Error(kNoSuchField);
+    if (HasDate() && value.month == 0) return Error(errors::kNoSuchField);
     if (rule == Zone::local && value.has_zone) {
         if (const int number = date::ToLocal(value, &value)) return Error(number);
     }
@@ -79,11 +76,11 @@ Status DateTimeDescriptor::Store(const date::DateTime& given) {
 }
 
 Status DateTimeDescriptor::Assign(const DateTimeDescriptor& from) {
-    return from.is_set_ ? Store(from.value_) : Error(kInvalidDateTime);
+    return from.is_set_ ? Store(from.value_) : Error(errors::kInvalidDateTime);
 }
 
 Status DateTimeDescriptor::SetDate(const date::DateTime& date) {
-    if (!HasDate()) return Error(kNoSuchField);
+    if (!HasDate()) return Error(errors::kNoSuchField);
     date::DateTime value = value_;
     value.year = date.year;
     value.month = date.month;
@@ -97,7 +94,7 @@ Status DateTimeDescriptor::SetDate(const date::DateTime& date) {
 
 // A descriptor that has no date yet keeps the time for when it gets one.
 Status DateTimeDescriptor::SetTime(const date::DateTime& time) {
-    if (!HasTime()) return Error(kNoSuchField);
+    if (!HasTime()) return Error(errors::kNoSuchField);
     date::DateTime value = value_;
     value.hour = time.hour;
     value.minute = time.minute;
@@ -113,15 +110,15 @@ Status DateTimeDescriptor::SetTime(const date::DateTime& time) {
 }
 
 Status DateTimeDescriptor::GetDate(date::DateTime* value) const {
-    if (!HasDate()) return Error(kNoSuchField);
-    if (!is_set_ || value_.month == 0) return Error(kInvalidDateTime);
+    if (!HasDate()) return Error(errors::kNoSuchField);
+    if (!is_set_ || value_.month == 0) return Error(errors::kInvalidDateTime);
     *value = value_;
     return {};
 }
 
 Status DateTimeDescriptor::GetTime(date::DateTime* value) const {
-    if (!HasTime()) return Error(kNoSuchField);
-    if (!is_set_) return Error(kInvalidDateTime);
+    if (!HasTime()) return Error(errors::kNoSuchField);
+    if (!is_set_) return Error(errors::kInvalidDateTime);
     *value = value_;
     return {};
 }
@@ -131,8 +128,8 @@ date::Flags DateTimeDescriptor::Check() const {
 }
 
 Status DateTimeDescriptor::Compare(const DateTimeDescriptor& left, const DateTimeDescriptor& right, int* result) {
-    if (!left.is_set_ || !right.is_set_) return Error(kInvalidDateTime);
-    if (left.HasDate() != right.HasDate()) return Error(kNotComparable);
+    if (!left.is_set_ || !right.is_set_) return Error(errors::kInvalidDateTime);
+    if (left.HasDate() != right.HasDate()) return Error(errors::kNotComparable);
     *result = date::CompareMoments(left.value_, right.value_);
     return {};
 }

@@ -6,13 +6,9 @@
 #include <string_view>
 
 #include "date/date.h"
+#include "handles/errors.h"
 
 namespace date {
-
-constexpr Errno kModelTooLong = 1801;
-constexpr Errno kBadElement = 1821;         // not an element, or one of timestamps in a model for dates
-constexpr Errno kTextBufferTooSmall = 22059;
-constexpr Errno kBadLanguage = 12705;
 
 // The models that hold when the application gives none.
 constexpr std::string_view kDateModel = "DD-MON-RR";                             // character data to and from DATE
@@ -28,7 +24,7 @@ const Language* FindLanguage(std::string_view name) noexcept;    // null when un
 // What a model may name.
 enum class Scope : unsigned char { date, timestamp };
 
-// Writes the value's text. *length is set on success, and on kTextBufferTooSmall to the size that is needed. No
+// Writes the value's text. *length is set on success, and on kBufferTooSmall to the size that is needed. No
 // terminator is written. The value must be valid.
 Errno ToText(const DateTime& value, std::string_view model, const Language& language, Scope scope, char* text,
              std::size_t capacity, std::size_t* length) noexcept;

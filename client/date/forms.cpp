@@ -1,5 +1,6 @@
 // The forms of a date that need no model: OCIDate, the seven bytes, the engines' text.
 #include "date/date.h"
+#include "handles/errors.h"
 #include "oci_types.h"
 
 namespace date {
@@ -177,16 +178,16 @@ Errno FromEngineText(std::string_view text, DateTime* result) noexcept {
     Reader reader(text);
     const bool before_christ = reader.Take('-') || named_era;
     int first = 0;
-    if (!reader.Number(6, &first)) return kBadText;
-    if (first > kMaxYear) return kBadYear;
+    if (!reader.Number(6, &first)) return errors::kTextMismatch;
+    if (first > kMaxYear) return errors::kBadYear;
     DateTime value;
     if (reader.Take('-')) {
         value.year = static_cast<std::int16_t>(before_christ ? -first : first);
-        if (!ReadDateAfterYear(reader, &value)) return kBadText;
+        if (!ReadDateAfterYear(reader, &value)) return errors::kTextMismatch;
         if (const Errno number = Validate(value)) return number;
     } else {
         value.hour = static_cast<std::uint8_t>(first);
-        if (first > 99 || before_christ || !ReadTime(reader, &value)) return kBadText;
+        if (first > 99 || before_christ || !ReadTime(reader, &value)) return errors::kTextMismatch;
         if (const Errno number = ValidateTime(value)) return number;
     }
     *result = value;

@@ -7,20 +7,10 @@
 #include "date/model.h"
 #include "date/parsed.h"
 #include "date/zone.h"
+#include "handles/errors.h"
 
 namespace date {
 namespace {
-
-constexpr Errno kNotForInput = 1820;
-constexpr Errno kModelEnds = 1830;
-constexpr Errno kTextEnds = 1840;
-constexpr Errno kNoHalfDay = 1855;
-constexpr Errno kNoEra = 1856;
-constexpr Errno kNoZone = 1857;
-constexpr Errno kNoDigit = 1858;
-constexpr Errno kNoLetter = 1859;
-constexpr Errno kMismatch = 1861;
-constexpr Errno kWrongDigits = 1862;
 
 constexpr MonthNames kRoman = {"i", "ii", "iii", "iv", "v", "vi", "vii", "viii", "ix", "x", "xi", "xii"};
 
@@ -55,11 +45,11 @@ public:
         for (;;) {
             if (const Errno number = model_.Next(scope_, &element)) return number;
             if (element.field == Field::end) break;
-            if (!element.input) return kNotForInput;
+            if (!element.input) return errors::kNotForInput;
             if (const Errno number = Take(element)) return number;
         }
         SkipBlanks();
-        return rest_.empty() ? parsed_.Resolve(result) : kModelEnds;
+        return rest_.empty() ? parsed_.Resolve(result) : errors::kModelEnds;
     }
 
 private:
@@ -73,20 +63,23 @@ private:
         }
         if (const Errno number = parsed_.Claim(element)) return number;
         if (!exact_) SkipBlanks();
-        if (rest_.empty()) return !exact_ && MayBeMissing(element) ? 0 : kTextEnds;
+        if (rest_.empty()) return !exact_ && MayBeMissing(element) ? 0 : errors::kTextEnds;
         return TakeField(element);
     }
 
     Errno TakeField(const Element& element) {
         switch (element.field) {
             case Field::month: return TakeMonth(element);
-            case Field::short_month_name: return TakeName(element, language_.short_months, language_.months, kBadMonth);
-            case Field::month_name: return TakeName(element, language_.months, language_.short_months, kBadMonth);
-            case Field::roman_month: return TakeName(element, kRoman, kRoman, kBadMonth);
-            case Field::short_day_name: return TakeName(element, language_.short_days, language_.days, kBadWeekday);
-            case Field::day_name: return TakeName(element, language_.days, language_.short_days, kBadWeekday);
-            case Field::half_day: return TakeWord(element, kHalfDays, kNoHalfDay);
-            case Field::era: return TakeWord(element, kEras, kNoEra);
+            case Field::short_month_name:
+                return TakeName(element, language_.short_months, language_.months, errors::kBadMonth);
+            case Field::month_name:
+                return TakeName(element, language_.months, language_.short_months, errors::kBadMonth);
+            case Field::roman_month: return TakeName(element, kRoman, kRoman, errors::kBadMonth);
+            case Field::short_day_name:
+                return TakeName(element, language_.short_days, language_.days, errors::kBadWeekday);
+            case Field::day_name: return TakeName(element, language_.days, language_.short_days, errors::kBadWeekday);
+            case Field::half_day: return TakeWord(element, kHalfDays, errors::kNoHalfDay);
+            case Field::era: return TakeWord(element, kEras, errors::kNoEra);
             case Field::comma_year: return TakeCommaYear(element);
             case Field::fraction: return TakeFraction(element);
             case Field::radix: return TakeRadix();
@@ -112,7 +105,7 @@ private:
     }
 
     Errno TakeMark(char mark) {
-        if (exact_) return rest_.empty() ? kTextEnds : TakeChar(mark) ? 0 : kMismatch;
+        if (exact_) return rest_.empty() ? errors::kTextEnds : TakeChar(mark) ? 0 : errors::kTextMismatch;
         const std::size_t before = rest_.size();
         SkipBlanks();
         if (rest_.empty() || (mark == ' ' && rest_.size() != before)) return 0;
@@ -124,14 +117,15 @@ private:
         }
         if (rest_.size() != before) return 0;
         // The mark is missing: what stands here must at least suit what comes next.
-        if (TakesNumber(next) ? !IsDigit(c) && !IsSign(c) : TakesWord(next) && !IsWordByte(c)) return kMismatch;
+        const bool fits = TakesNumber(next) ? IsDigit(c) || IsSign(c) : !TakesWord(next) || IsWordByte(c);
+        if (!fits) return errors::kTextMismatch;
         return 0;
     }
 
     Errno TakeQuoted(std::string_view wanted) {
         if (!exact_ && !wanted.starts_with(' ')) SkipBlanks();
-        if (rest_.size() < wanted.size()) return kTextEnds;
-        if (!StartsWithFolded(rest_, wanted)) return kMismatch;
+        if (rest_.size() < wanted.size()) return errors::kTextEnds;
+        if (!StartsWithFolded(rest_, wanted)) return errors::kTextMismatch;
         rest_.remove_prefix(wanted.size());
         return 0;
     }
@@ -164,24 +158,24 @@ private:
             SkipBlanks();    // what stands for a plus
         }
         const std::size_t digits = DigitsOf(element);
-        if (digits == 0) return kNoDigit;
-        if (exact_ && filled_ && digits != element.width) return kWrongDigits;
+        if (digits == 0) return errors::kNoDigit;
+        if (exact_ && filled_ && digits != element.width) return errors::kWrongDigits;
         const int value = TakeDigits(digits);
         return parsed_.Set(element, negative ? -value : value, digits);
     }
 
     Errno TakeCommaYear(const Element& element) {
         const std::size_t thousands = CountDigits(1);
-        if (thousands == 0) return kNoDigit;
+        if (thousands == 0) return errors::kNoDigit;
         const int value = TakeDigits(thousands);
-        if (!TakeChar(',')) return kMismatch;
-        if (CountDigits(3) != 3) return kWrongDigits;
+        if (!TakeChar(',')) return errors::kTextMismatch;
+        if (CountDigits(3) != 3) return errors::kWrongDigits;
         return parsed_.Set(element, value * 1000 + TakeDigits(3), 4);
     }
 
     Errno TakeMonth(const Element& element) {
         if (exact_ || !IsWordByte(rest_.front())) return TakeNumber(element);
-        return TakeName(element, language_.months, language_.short_months, kBadMonth);
+        return TakeName(element, language_.months, language_.short_months, errors::kBadMonth);
     }
 
     // FX takes the name in the form that the model asks for, and the blanks that fill it up.
@@ -190,7 +184,7 @@ private:
                    const std::array<std::string_view, count>& others, Errno otherwise) {
         std::size_t length = 0;
         const int found = FindName(names, exact_ ? names : others, rest_, &length);
-        if (found < 0) return count == 7 && !IsWordByte(rest_.front()) ? kNoLetter : otherwise;
+        if (found < 0) return count == 7 && !IsWordByte(rest_.front()) ? errors::kNoLetter : otherwise;
         const std::size_t width = NameWidth(names), written = CharacterCount(rest_.substr(0, length));
         rest_.remove_prefix(length);
         for (std::size_t i = written; exact_ && filled_ && i < width && TakeChar(' '); ++i) continue;
@@ -204,11 +198,11 @@ private:
             rest_.remove_prefix(word.text.size());
             return parsed_.Set(element, word.value, 0);
         }
-        return IsWordByte(rest_.front()) ? otherwise : kNoLetter;
+        return IsWordByte(rest_.front()) ? otherwise : errors::kNoLetter;
     }
 
     Errno TakeRadix() {
-        if (exact_ && rest_.front() != '.') return kMismatch;
+        if (exact_ && rest_.front() != '.') return errors::kTextMismatch;
         if (!TakeChar('.')) TakeChar(',');
         return 0;
     }
@@ -216,7 +210,7 @@ private:
     // Digits may be missing altogether, with the point before them.
     Errno TakeFraction(const Element& element) {
         const std::size_t digits = CountDigits(element.width ? element.width : 9);
-        if (exact_ && filled_ && element.width && digits != element.width) return kWrongDigits;
+        if (exact_ && filled_ && element.width && digits != element.width) return errors::kWrongDigits;
         auto nanosecond = static_cast<std::uint32_t>(TakeDigits(digits));
         for (std::size_t i = digits; i < 9; ++i) nanosecond *= 10;
         parsed_.SetFraction(nanosecond);
@@ -239,7 +233,7 @@ private:
 
     // Only tells which of two same hours is meant; the region's own rule decides that.
     Errno TakeZoneName() {
-        if (!IsLetter(rest_.front())) return kNoZone;
+        if (!IsLetter(rest_.front())) return errors::kNoZone;
         while (!rest_.empty() && IsLetter(rest_.front())) rest_.remove_prefix(1);
         return 0;
     }

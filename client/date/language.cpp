@@ -2,6 +2,7 @@
 #include "date/language.h"
 
 #include "date/letters.h"
+#include "handles/errors.h"
 
 namespace date {
 namespace {
@@ -80,7 +81,7 @@ template int FindName(const DayNames&, const DayNames&, std::string_view, std::s
 Errno WeekdayFromName(std::string_view name, const Language& language, int* day_of_week) noexcept {
     std::size_t length = 0;
     const int found = FindName(language.days, language.short_days, name, &length);
-    if (found < 0 || length != name.size()) return kBadWeekday;
+    if (found < 0 || length != name.size()) return errors::kBadWeekday;
     *day_of_week = found;
     return 0;
 }

@@ -2,6 +2,7 @@
 #include "date/model.h"
 
 #include "date/letters.h"
+#include "handles/errors.h"
 
 namespace date {
 namespace {
@@ -101,15 +102,15 @@ LetterCase CaseOf(std::string_view written) {
 Errno Model::Next(Scope scope, Element* element) noexcept {
     *element = {};
     if (rest_.empty()) return 0;
-    if (rest_.front() == '"') return TakeQuoted(element) ? 0 : kBadElement;
+    if (rest_.front() == '"') return TakeQuoted(element) ? 0 : errors::kBadElement;
     if (IsMark(rest_.front())) {
         element->field = Field::mark;
         element->text = rest_.substr(0, 1);
         rest_.remove_prefix(1);
         return 0;
     }
-    if (!TakeNamed(element)) return kBadElement;
-    return element->timestamp && scope == Scope::date ? kBadElement : 0;
+    if (!TakeNamed(element)) return errors::kBadElement;
+    return element->timestamp && scope == Scope::date ? errors::kBadElement : 0;
 }
 
 bool Model::TakeQuoted(Element* element) noexcept {

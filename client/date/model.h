@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "date/format.h"
+#include "handles/errors.h"
 
 namespace date {
 

@@ -2,6 +2,7 @@
 #include "date/parsed.h"
 
 #include "date/zone.h"
+#include "handles/errors.h"
 
 namespace date {
 namespace {
@@ -10,22 +11,17 @@ namespace {
 constexpr struct { Field slot; Errno number; } kTwice[] = {
     {Field::year, 1812}, {Field::hour24, 1813}, {Field::half_day, 1814}, {Field::era, 1815}, {Field::month, 1816},
     {Field::weekday, 1817}};
-constexpr Errno kAnyTwice = 1810;
-
-constexpr Errno kJulianWithDayOfYear = 1811;
-constexpr Errno kHour24WithHalfDay = 1818;
-constexpr Errno kSignedYearWithEra = 1819;
 
 constexpr struct { Field field; int lowest, highest; Errno number; } kRanges[] = {
-    {Field::month, 1, 12, kBadMonth},
-    {Field::day, 1, 31, kBadDay},
+    {Field::month, 1, 12, errors::kBadMonth},
+    {Field::day, 1, 31, errors::kBadDay},
     {Field::day_of_year, 1, 366, 1848},
-    {Field::weekday, 1, 7, kBadWeekday},
+    {Field::weekday, 1, 7, errors::kBadWeekday},
     {Field::julian, 1, 5373484, 1854},
     {Field::hour12, 1, 12, 1849},
-    {Field::hour24, 0, 23, kBadHour},
-    {Field::minute, 0, 59, kBadMinute},
-    {Field::second, 0, 59, kBadSecond},
+    {Field::hour24, 0, 23, errors::kBadHour},
+    {Field::minute, 0, 59, errors::kBadMinute},
+    {Field::second, 0, 59, errors::kBadSecond},
     {Field::second_of_day, 0, 86399, 1853}};
 
 // Two digits mean the year next to now: in the half of a century that lies nearer.
@@ -60,7 +56,7 @@ Field SlotOf(Field field) noexcept {
 
 Errno FromJulianDay(int julian, DayNumber* day) noexcept {
     constexpr int kYearZero = 1721059, kYearOne = 1721424;
-    if (julian >= kYearZero && julian < kYearOne) return kNotInCalendar;
+    if (julian >= kYearZero && julian < kYearOne) return errors::kNotInCalendar;
     *day = julian < kYearZero ? julian + 365 : julian;
     return 0;
 }
@@ -72,14 +68,14 @@ Errno Parsed::Claim(const Element& element) noexcept {
         for (const auto& row : kTwice) {
             if (row.slot == slot) return row.number;
         }
-        return kAnyTwice;
+        return errors::kElementTwice;
     }
     claimed_[static_cast<std::size_t>(slot)] = true;
     if (element.field == Field::hour24) whole_day_hour_ = true;
     if (element.field == Field::year) signed_year_ = element.has_sign;
-    if (is_claimed(Field::julian) && is_claimed(Field::day_of_year)) return kJulianWithDayOfYear;
-    if (whole_day_hour_ && is_claimed(Field::half_day)) return kHour24WithHalfDay;
-    return signed_year_ && is_claimed(Field::era) ? kSignedYearWithEra : 0;
+    if (is_claimed(Field::julian) && is_claimed(Field::day_of_year)) return errors::kJulianWithDayOfYear;
+    if (whole_day_hour_ && is_claimed(Field::half_day)) return errors::kHour24WithHalfDay;
+    return signed_year_ && is_claimed(Field::era) ? errors::kSignedYearWithEra : 0;
 }
 
 void Parsed::Put(Field slot, int value) {

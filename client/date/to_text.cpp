@@ -6,6 +6,7 @@
 #include "date/model.h"
 #include "date/words.h"
 #include "date/zone.h"
+#include "handles/errors.h"
 
 namespace date {
 namespace {
@@ -268,7 +269,7 @@ Errno ToText(const DateTime& value, std::string_view model, const Language& lang
     Writer writer(text, capacity);
     if (const Errno number = Formatter(value, language, scope, writer).Run(model)) return number;
     *length = writer.Length();
-    return writer.Length() > capacity ? kTextBufferTooSmall : 0;
+    return writer.Length() > capacity ? errors::kBufferTooSmall : 0;
 }
 
 }  // namespace date

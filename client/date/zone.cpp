@@ -14,11 +14,11 @@
 
 #include "date/letters.h"
 #include "date/zone_rules.h"
+#include "handles/errors.h"
 
 namespace date {
 namespace {
 
-constexpr Errno kOutOfMemory = 1019;
 constexpr const char* kZoneDirectory = "/usr/share/zoneinfo/";
 constexpr const char* kLocalZone = "/etc/localtime";
 constexpr std::size_t kMaxFile = 1 << 20;
@@ -159,17 +159,17 @@ Errno SetWrittenOffset(std::string_view text, DateTime* value) {
     const bool west = text.front() == '-';
     text.remove_prefix(1);
     int hours = 0, minutes = 0;
-    if (!TakeNumber(text, &hours)) return kBadZone;
+    if (!TakeNumber(text, &hours)) return errors::kNoZone;
     if (text.starts_with(':')) {
         text.remove_prefix(1);
-        if (!TakeNumber(text, &minutes)) return kBadZone;
+        if (!TakeNumber(text, &minutes)) return errors::kNoZone;
     }
-    return text.empty() ? SetOffset(west, hours, minutes, value) : kBadZone;
+    return text.empty() ? SetOffset(west, hours, minutes, value) : errors::kNoZone;
 }
 
 Errno SetRegion(std::string_view name, DateTime* value) {
     const std::uint16_t number = TheRegions().Find(name);
-    if (number == 0) return kUnknownRegion;
+    if (number == 0) return errors::kNoSuchZone;
     const ZoneRules& rules = TheRegions().Get(number)->rules;
     SetOffset(OffsetMinutes(rules.AtWallTime(WallSeconds(*value))), number, value);
     return 0;
@@ -179,9 +179,9 @@ Errno SetRegion(std::string_view name, DateTime* value) {
 
 Errno SetOffset(bool west, int hours, int minutes, DateTime* value) noexcept {
     const int furthest = west ? 12 : 14;
-    if (hours > furthest) return kBadZoneHour;
-    if (minutes > 59) return kBadZoneMinute;
-    if (hours == furthest && minutes > 0) return kBadZoneHour;
+    if (hours > furthest) return errors::kBadZoneHour;
+    if (minutes > 59) return errors::kBadZoneMinute;
+    if (hours == furthest && minutes > 0) return errors::kBadZoneHour;
     SetOffset((west ? -1 : 1) * (hours * 60 + minutes), 0, value);
     return 0;
 }
@@ -193,7 +193,7 @@ Errno SetZone(std::string_view zone, DateTime* value) noexcept try {
     }
     return zone.front() == '+' || zone.front() == '-' ? SetWrittenOffset(zone, value) : SetRegion(zone, value);
 } catch (const std::bad_alloc&) {
-    return kOutOfMemory;
+    return errors::kOutOfMemory;
 }
 
 std::string_view RegionName(const DateTime& value) noexcept {

@@ -9,11 +9,6 @@
 
 namespace date {
 
-constexpr Errno kBadZone = 1857;
-constexpr Errno kBadZoneHour = 1874;
-constexpr Errno kBadZoneMinute = 1875;
-constexpr Errno kUnknownRegion = 1882;
-
 // Gives `value`, whose date and time are local, the zone that a text names: "+hh:mm", "-hh:mm" or a region. In a region
 // the offset is the one in force at that local time; of an hour that comes twice the first is meant, one that is
 // skipped counts with the offset before it. Empty: the zone of the process.

@@ -5,12 +5,12 @@
 
 #include "engine/engine.h"
 #include "engine/sqlite/sqlite.h"
+#include "handles/errors.h"
 #include "platform/ini.h"
 
 namespace engine {
 namespace {
 
-constexpr int kNoDriver = 21520;
 constexpr const char* kDefaultName = "kelp";
 
 // The directory of kelpcli.ini and of the databases that a plain word names.
@@ -41,7 +41,8 @@ std::string FileOf(std::string_view database) {
 
 Status Connect(std::string_view database, std::unique_ptr<Connection>& connection) {
     if (database.empty()) database = kDefaultName;
-    if (IsUrl(database) || !UrlOf(database).empty()) return Error(kNoDriver, "no PostgreSQL engine in this build");
+    const bool is_remote = IsUrl(database) || !UrlOf(database).empty();
+    if (is_remote) return Error(errors::kNoDriver, "no PostgreSQL engine in this build");
     return sqlite::Connect(FileOf(database), connection);
 }
 

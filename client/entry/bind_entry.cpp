@@ -1,20 +1,18 @@
 // Binds and defines.
 #include "entry/text_argument.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "statements/statement.h"
 
 namespace {
 
-constexpr int kNoSuchBind = 1036;
-constexpr int kBadText = 24501;
-
 Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4 length,
                   const Statement::BindArguments& arguments) {
-    if (!name) return Error(kNoSuchBind);
+    if (!name) return Error(errors::kNoSuchBind);
     // A length below 0 asks to measure the name.
     const std::size_t measured = length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length);
     const TextArgument text(statement.Env(), name, measured, false);
-    return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(kBadText);
+    return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(errors::kBadText);
 }
 
 // Steps of an array of structures, for a bind or a define.

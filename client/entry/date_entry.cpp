@@ -4,11 +4,10 @@
 #include "date/date.h"
 #include "date/format.h"
 #include "entry/text_argument.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 
 namespace {
-
-constexpr int kMalformedText = 24501;
 
 // What both text functions take beside the text: the model and the language.
 class ModelArguments {
@@ -18,9 +17,9 @@ public:
         : model_(environment, model, model_length, false), language_(environment, language, language_length, false) {}
 
     date::Errno Resolve() {
-        if (!model_.Valid() || !language_.Valid()) return kMalformedText;
+        if (!model_.Valid() || !language_.Valid()) return errors::kBadText;
         if (!language_.View().empty()) known_ = date::FindLanguage(language_.View());
-        return known_ ? 0 : date::kBadLanguage;
+        return known_ ? 0 : errors::kBadLanguage;
     }
 
     [[nodiscard]] std::string_view Model() const {
@@ -38,7 +37,7 @@ private:
 template <class Change>
 sword MakeDate(OCIError* err, const OCIDate* given, OCIDate* out, Change change) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
-        if (!given || !out) return Error(kNullArgument);
+        if (!given || !out) return Error(errors::kNullArgument);
         date::DateTime result;
         if (const int number = change(date::FromOciDate(*given), &result)) return Error(number);
         date::ToOciDate(result, out);
@@ -50,7 +49,7 @@ sword MakeDate(OCIError* err, const OCIDate* given, OCIDate* out, Change change)
 template <class Number, class Measure>
 sword MeasureDates(OCIError* err, const OCIDate* left, const OCIDate* right, Number* out, Measure measure) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
-        if (!left || !right || !out) return Error(kNullArgument);
+        if (!left || !right || !out) return Error(errors::kNullArgument);
         const date::DateTime first = date::FromOciDate(*left), second = date::FromOciDate(*right);
         if (const int number = date::Validate(first)) return Error(number);
         if (const int number = date::Validate(second)) return Error(number);
@@ -69,7 +68,7 @@ Status WriteText(const Environment& environment, const date::DateTime& value, co
                             &length);
     };
     int number = write();
-    if (number == date::kTextBufferTooSmall) {
+    if (number == errors::kBufferTooSmall) {
         text.resize(length);
         number = write();
     }
@@ -79,7 +78,7 @@ Status WriteText(const Environment& environment, const date::DateTime& value, co
     const ub4 room = *size;
     *size = static_cast<ub4>(shown.size());
     if (shown.size() > room) {
-        return Error(date::kTextBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
+        return Error(errors::kBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
     }
     shown.copy(reinterpret_cast<char*>(out), shown.size());
     return {};
@@ -108,9 +107,9 @@ sword OCIDateLastDay(OCIError* err, const OCIDate* given, OCIDate* out) {
 
 sword OCIDateNextDay(OCIError* err, const OCIDate* given, const OraText* day, ub4 dayLen, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
-        if (!given || !day || !out) return Error(kNullArgument);
+        if (!given || !day || !out) return Error(errors::kNullArgument);
         const TextArgument name(error.Env(), day, dayLen, false);
-        if (!name.Valid()) return Error(kMalformedText);
+        if (!name.Valid()) return Error(errors::kBadText);
         int day_of_week = 0;
         if (const int number = date::WeekdayFromName(name.View(), date::kEnglish, &day_of_week)) return Error(number);
         date::DateTime result;
@@ -122,7 +121,7 @@ sword OCIDateNextDay(OCIError* err, const OCIDate* given, const OraText* day, ub
 
 sword OCIDateCheck(OCIError* err, const OCIDate* given, uword* flags) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
-        if (!given || !flags) return Error(kNullArgument);
+        if (!given || !flags) return Error(errors::kNullArgument);
         *flags = date::Check(date::FromOciDate(*given));
         return {};
     });
@@ -138,7 +137,7 @@ sword OCIDateDaysBetween(OCIError* err, const OCIDate* date1, const OCIDate* dat
 
 sword OCIDateSysDate(OCIError* err, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
-        if (!out) return Error(kNullArgument);
+        if (!out) return Error(errors::kNullArgument);
         date::ToOciDate(date::Now(), out);
         return {};
     });
@@ -147,9 +146,9 @@ sword OCIDateSysDate(OCIError* err, OCIDate* out) {
 sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraText* fmt, ub1 fmtLen,
                       const OraText* lang, ub4 langLen, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
-        if (!str || !out) return Error(kNullArgument);
+        if (!str || !out) return Error(errors::kNullArgument);
         const TextArgument text(error.Env(), str, strLen, false);
-        if (!text.Valid()) return Error(kMalformedText);
+        if (!text.Valid()) return Error(errors::kBadText);
         ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
         if (const int number = arguments.Resolve()) return Error(number);
         date::DateTime value;
@@ -165,7 +164,7 @@ sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraTe
 sword OCIDateToText(OCIError* err, const OCIDate* given, const OraText* fmt, ub1 fmtLen, const OraText* lang,
                     ub4 langLen, ub4* bufsize, OraText* buf) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
-        if (!given || !bufsize || !buf) return Error(kNullArgument);
+        if (!given || !bufsize || !buf) return Error(errors::kNullArgument);
         const date::DateTime value = date::FromOciDate(*given);
         if (const int number = date::Validate(value)) return Error(number);
         ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);

@@ -3,15 +3,14 @@
 #include "date/descriptor.h"
 #include "date/fraction.h"
 #include "entry/text_argument.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 
 namespace {
 
-constexpr int kMalformedText = 24501;
-
 // A descriptor that is no living one is refused like any bad handle; null is a missing argument.
 Status FindDescriptor(const OCIDateTime* pointer, DateTimeDescriptor*& descriptor) {
-    if (!pointer) return Error(kNullArgument);
+    if (!pointer) return Error(errors::kNullArgument);
     descriptor = Live<DateTimeDescriptor>(pointer);
     return descriptor ? Status() : InvalidHandle();
 }
@@ -44,7 +43,7 @@ sword OCIDateTimeAssign(dvoid* hndl, OCIError* err, const OCIDateTime* from, OCI
 
 sword OCIDateTimeCheck(dvoid* hndl, OCIError* err, const OCIDateTime* date, ub4* flags) {
     return EnterDateTime(hndl, err, date, [flags](Environment&, const DateTimeDescriptor& descriptor) -> Status {
-        if (!flags) return Error(kNullArgument);
+        if (!flags) return Error(errors::kNullArgument);
         *flags = descriptor.Check();
         return {};
     });
@@ -52,7 +51,7 @@ sword OCIDateTimeCheck(dvoid* hndl, OCIError* err, const OCIDateTime* date, ub4*
 
 sword OCIDateTimeCompare(dvoid* hndl, OCIError* err, const OCIDateTime* date1, const OCIDateTime* date2, sword* out) {
     return EnterDateTimes(hndl, err, date1, date2, [out](const auto& left, const auto& right) {
-        return out ? DateTimeDescriptor::Compare(left, right, out) : Error(kNullArgument);
+        return out ? DateTimeDescriptor::Compare(left, right, out) : Error(errors::kNullArgument);
     });
 }
 
@@ -60,15 +59,15 @@ sword OCIDateTimeConstruct(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 ye
                            ub1 min, ub1 sec, ub4 fsec, OraText* tz, size_t tzLen) {
     return EnterDateTime(hndl, err, date, [&](Environment& environment, DateTimeDescriptor& descriptor) -> Status {
         date::DateTime fields{.year = year, .month = month, .day = day, .hour = hour, .minute = min, .second = sec};
-        if (!date::FractionToNanoseconds(fsec, &fields.nanosecond)) return Error(date::kBadFraction);
+        if (!date::FractionToNanoseconds(fsec, &fields.nanosecond)) return Error(errors::kBadFraction);
         const TextArgument zone(environment, tz, tzLen, false);
-        return zone.Valid() ? descriptor.Construct(fields, zone.View()) : Error(kMalformedText);
+        return zone.Valid() ? descriptor.Construct(fields, zone.View()) : Error(errors::kBadText);
     });
 }
 
 sword OCIDateTimeGetDate(dvoid* hndl, OCIError* err, const OCIDateTime* date, sb2* year, ub1* month, ub1* day) {
     return EnterDateTime(hndl, err, date, [&](Environment&, const DateTimeDescriptor& descriptor) -> Status {
-        if (!year || !month || !day) return Error(kNullArgument);
+        if (!year || !month || !day) return Error(errors::kNullArgument);
         date::DateTime value;
         Status got = descriptor.GetDate(&value);
         if (!got.Ok()) return got;
@@ -81,7 +80,7 @@ sword OCIDateTimeGetDate(dvoid* hndl, OCIError* err, const OCIDateTime* date, sb
 
 sword OCIDateTimeGetTime(dvoid* hndl, OCIError* err, OCIDateTime* date, ub1* hour, ub1* min, ub1* sec, ub4* fsec) {
     return EnterDateTime(hndl, err, date, [&](Environment&, const DateTimeDescriptor& descriptor) -> Status {
-        if (!hour || !min || !sec || !fsec) return Error(kNullArgument);
+        if (!hour || !min || !sec || !fsec) return Error(errors::kNullArgument);
         date::DateTime value;
         Status got = descriptor.GetTime(&value);
         if (!got.Ok()) return got;
@@ -102,7 +101,7 @@ sword OCI_datetimeSetDate(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 yea
 sword OCI_datetimeSetTime(dvoid* hndl, OCIError* err, OCIDateTime* date, ub1 hour, ub1 min, ub1 sec, ub4 fsec) {
     return EnterDateTime(hndl, err, date, [&](Environment&, DateTimeDescriptor& descriptor) -> Status {
         date::DateTime time{.hour = hour, .minute = min, .second = sec};
-        if (!date::FractionToNanoseconds(fsec, &time.nanosecond)) return Error(date::kBadFraction);
+        if (!date::FractionToNanoseconds(fsec, &time.nanosecond)) return Error(errors::kBadFraction);
         return descriptor.SetTime(time);
     });
 }

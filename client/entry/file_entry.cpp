@@ -2,29 +2,30 @@
 #include <string>
 
 #include "files/file.h"
+#include "handles/errors.h"
 #include "handles/package.h"
 
 namespace {
 
 constexpr ub4 kLargestArea = 256U << 20;    // bytes at once; a length beyond that is a mistake, and nothing to be read
 
-constinit Package the_package{kInvalidFileArgument, "the file package is not initialised"};
+constinit Package the_package{errors::kInvalidFileArgument, "the file package is not initialised"};
 
 // Calls on an open file: body(file).
 template <class Body>
 sword EnterFile(void* handle, OCIError* err, OCIFileObject* pointer, Body body) {
     return the_package.Enter(handle, err, [&](Environment&) -> Status {
         File* file = Live<File>(pointer);
-        return file ? body(*file) : Error(kInvalidFileObject);
+        return file ? body(*file) : Error(errors::kInvalidFileObject);
     });
 }
 
 // The file of a name in a directory; both are closed with a zero, and the directory may be missing.
 Status FullName(const Environment& environment, const OraText* name, const OraText* path, std::string& full) {
-    if (!name) return Error(kInvalidFileArgument, "no file name");
+    if (!name) return Error(errors::kInvalidFileArgument, "no file name");
     const TextIn file(environment, name, TextLength(environment, name));
     const TextIn directory(environment, path, path ? TextLength(environment, path) : 0);
-    if (!file.Valid() || !directory.Valid()) return Error(24501);
+    if (!file.Valid() || !directory.Valid()) return Error(errors::kBadText);
     full = directory.View();
     if (!full.empty() && full.back() != '/') full += '/';
     full += file.View();
@@ -35,7 +36,7 @@ Status FullName(const Environment& environment, const OraText* name, const OraTe
 template <class Answer, class Wanted, class Ask>
 sword AskFile(void* handle, OCIError* err, const OraText* name, const OraText* path, Wanted* out, Ask ask) {
     return the_package.Enter(handle, err, [&](const Environment& environment) -> Status {
-        if (!out) return Error(kInvalidFileArgument, "no place for the result");
+        if (!out) return Error(errors::kInvalidFileArgument, "no place for the result");
         std::string full;
         Status named = FullName(environment, name, path, full);
         if (!named.Ok()) return named;
@@ -48,7 +49,7 @@ sword AskFile(void* handle, OCIError* err, const OraText* name, const OraText* p
 
 Status OpenFile(Environment& environment, OCIFileObject** out, const OraText* name, const OraText* path, ub4 mode,
                 ub4 create, ub4 type) {
-    if (!out) return Error(kInvalidFileArgument, "no place for the file object");
+    if (!out) return Error(errors::kInvalidFileArgument, "no place for the file object");
     std::string full;
     const bool standard = type >= OCI_FILE_STDIN && type <= OCI_FILE_STDERR;
     Status named = standard ? Status() : FullName(environment, name, path, full);
@@ -61,8 +62,8 @@ Status OpenFile(Environment& environment, OCIFileObject** out, const OraText* na
 }
 
 Status CheckArea(const void* area, ub4 size, const ub4* count) {
-    if (!area || !count) return Error(kInvalidFileArgument, "no area or no place for its count");
-    return size > kLargestArea ? Error(kInvalidFileArgument, "length too large") : Status();
+    if (!area || !count) return Error(errors::kInvalidFileArgument, "no area or no place for its count");
+    return size > kLargestArea ? Error(errors::kInvalidFileArgument, "length too large") : Status();
 }
 
 }  // namespace

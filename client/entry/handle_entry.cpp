@@ -3,6 +3,7 @@
 #include <span>
 
 #include "date/descriptor.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "handles/plain_objects.h"
 #include "oci.h"
@@ -12,10 +13,6 @@
 #include "values/rowid_descriptor.h"
 
 namespace {
-
-constexpr int kIllegalHandleType = 24316;
-constexpr int kInvalidObjectType = 24332;
-constexpr int kHandleInUse = 24386;
 
 template <class T>
 Object* Make(Object& parent, TypeCode type, size_t extra) { return Create<T>(parent, type, extra); }
@@ -107,7 +104,7 @@ const Maker* Find(std::span<const Maker> makers, TypeCode type) {
 
 Status MakeOne(std::span<const Maker> makers, int unknown_type, Environment& environment, dvoid** out, TypeCode type,
                size_t extra, dvoid** extra_out) {
-    if (!out) return Error(kNullArgument);
+    if (!out) return Error(errors::kNullArgument);
     const Maker* maker = Find(makers, type);
     if (!maker) return Error(unknown_type);
     Object* object = maker->make(environment, type, extra);
@@ -118,9 +115,9 @@ Status MakeOne(std::span<const Maker> makers, int unknown_type, Environment& env
 
 // The user memory of the whole array belongs to what its descriptors hang below.
 Status MakeArray(Environment& environment, dvoid** array, TypeCode type, ub4 count, size_t extra, dvoid** extra_out) {
-    if (!array || count == 0) return Error(kNullArgument);
+    if (!array || count == 0) return Error(errors::kNullArgument);
     const Maker* maker = Find(kDescriptors, type);
-    if (!maker) return Error(kInvalidObjectType);
+    if (!maker) return Error(errors::kInvalidObjectType);
     auto* whole = Create<DescriptorArray>(environment, 0, extra);
     try {
         for (ub4 index = 0; index < count; ++index) array[index] = maker->make(*whole, type, 0);
@@ -141,7 +138,8 @@ Object* Freeable(std::span<const Maker> makers, const void* pointer, TypeCode ty
 
 sword Free(Object& object) noexcept {
     const SerialLock lock(object);
-    if (object.InUse()) return EnterEnvironment(&object.Env(), [](Environment&) { return Error(kHandleInUse); });
+    if (object.InUse())
+        return EnterEnvironment(&object.Env(), [](Environment&) { return Error(errors::kHandleInUse); });
     return Destroy(&object) ? OCI_SUCCESS : OCI_INVALID_HANDLE;
 }
 
@@ -149,7 +147,7 @@ sword Free(Object& object) noexcept {
 
 sword OCIHandleAlloc(const dvoid* parent, dvoid** out, ub4 type, size_t extra, dvoid** extraOut) {
     return EnterEnvironment(parent, [&](Environment& environment) {
-        return MakeOne(kHandles, kIllegalHandleType, environment, out, type, extra, extraOut);
+        return MakeOne(kHandles, errors::kIllegalHandleType, environment, out, type, extra, extraOut);
     });
 }
 
@@ -161,7 +159,7 @@ sword OCIHandleFree(dvoid* hndl, ub4 type) {
 
 sword OCIDescriptorAlloc(const dvoid* parent, dvoid** out, ub4 type, size_t extra, dvoid** extraOut) {
     return EnterEnvironment(parent, [&](Environment& environment) {
-        return MakeOne(kDescriptors, kInvalidObjectType, environment, out, type, extra, extraOut);
+        return MakeOne(kDescriptors, errors::kInvalidObjectType, environment, out, type, extra, extraOut);
     });
 }
 

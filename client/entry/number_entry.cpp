@@ -3,6 +3,7 @@
 #include <string>
 
 #include "entry/text_argument.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "number/format.h"
 #include "number/number.h"
@@ -11,12 +12,11 @@ namespace {
 
 using number::Errno;
 
-constexpr int kMalformedText = 24501;
 constexpr ub4 kLargestBuffer = 0x7FFFFFFF;  // above, a size was negative
 
 // The record of a refused operation. Of malformed operands it names the first.
 Status Refused(Errno error, std::initializer_list<const OCINumber*> operands) {
-    if (error != number::kBadNumber) return error ? Error(error) : Status();
+    if (error != errors::kBadNumber) return error ? Error(error) : Status();
     int position = 1;
     for (const OCINumber* operand : operands) {
         if (!number::IsValid(*operand)) return Error(error, "number " + std::to_string(position));
@@ -30,9 +30,9 @@ template <class Result, class Compute>
 sword Run(OCIError* err, std::initializer_list<const OCINumber*> operands, Result* result, Compute compute) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
         for (const OCINumber* operand : operands) {
-            if (!operand) return Error(kNullArgument);
+            if (!operand) return Error(errors::kNullArgument);
         }
-        if (!result) return Error(kNullArgument);
+        if (!result) return Error(errors::kNullArgument);
         const Errno error = compute();
         return error ? Refused(error, operands) : Status();
     });
@@ -59,9 +59,9 @@ bool IsIntegerLength(uword length) { return length == 1 || length == 2 || length
 // An unusual length comes with a null pointer from callers that have no integer of that width: the length is told
 // first.
 Errno CheckInteger(uword length, uword sign, const void* integer, const OCINumber* value) {
-    if (!IsIntegerLength(length)) return number::kBadIntegerLength;
-    if (sign != OCI_NUMBER_UNSIGNED && sign != OCI_NUMBER_SIGNED) return number::kBadSignFlag;
-    return integer && value ? 0 : kNullArgument;
+    if (!IsIntegerLength(length)) return errors::kBadIntegerLength;
+    if (sign != OCI_NUMBER_UNSIGNED && sign != OCI_NUMBER_SIGNED) return errors::kBadSignFlag;
+    return integer && value ? 0 : errors::kNullArgument;
 }
 
 template <class Real, Errno (*kConvert)(const OCINumber&, Real*) noexcept>
@@ -104,7 +104,7 @@ public:
         : model_(environment, model, model_length, false), nls_text_(environment, nls, nls_length, false) {}
 
     Errno Resolve() {
-        if (!model_.Valid() || !nls_text_.Valid()) return kMalformedText;
+        if (!model_.Valid() || !nls_text_.Valid()) return errors::kBadText;
         return number::ParseNls(nls_text_.View(), &nls_);
     }
     [[nodiscard]] std::string_view Model() const { return model_.View(); }
@@ -117,7 +117,7 @@ private:
 };
 
 Status TooSmall(std::size_t needed) {
-    return Error(number::kBufferTooSmall, std::to_string(needed) + " bytes are needed");
+    return Error(errors::kBufferTooSmall, std::to_string(needed) + " bytes are needed");
 }
 
 // Writes straight into the application's area.
@@ -125,7 +125,7 @@ Status WriteText(const OCINumber& value, const FormatArguments& arguments, ub4* 
     std::size_t length = 0;
     const Errno error =
         number::ToText(value, arguments.Model(), arguments.Nls(), reinterpret_cast<char*>(out), *size, &length);
-    if (error == number::kBufferTooSmall) return TooSmall(length);
+    if (error == errors::kBufferTooSmall) return TooSmall(length);
     if (error) return Refused(error, {&value});
     *size = static_cast<ub4>(length);
     return {};
@@ -140,7 +140,7 @@ Status WriteUtf16(const Environment& environment, const OCINumber& value, const 
         return number::ToText(value, arguments.Model(), arguments.Nls(), text.data(), text.size(), &length);
     };
     Errno error = write();
-    if (error == number::kBufferTooSmall) {
+    if (error == errors::kBufferTooSmall) {
         text.resize(length);
         error = write();
     }
@@ -321,7 +321,7 @@ sword OCINumberToInt(OCIError* err, const OCINumber* value, uword length, uword 
 sword OCINumberFromReal(OCIError* err, const dvoid* value, uword length, OCINumber* out) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
         const RealWidth* width = FindRealWidth(length);
-        if (!width || !value || !out) return Error(kNullArgument);
+        if (!width || !value || !out) return Error(errors::kNullArgument);
         const Errno error = width->load(value, out);
         return error ? Error(error) : Status();
     });
@@ -330,7 +330,7 @@ sword OCINumberFromReal(OCIError* err, const dvoid* value, uword length, OCINumb
 sword OCINumberToReal(OCIError* err, const OCINumber* value, uword length, dvoid* out) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
         const RealWidth* width = FindRealWidth(length);
-        if (!width || !value || !out) return Error(kNullArgument);
+        if (!width || !value || !out) return Error(errors::kNullArgument);
         return Refused(width->store(*value, out), {value});
     });
 }
@@ -339,10 +339,10 @@ sword OCINumberToReal(OCIError* err, const OCINumber* value, uword length, dvoid
 sword OCINumberToRealArray(OCIError* err, const OCINumber** values, uword elems, uword length, dvoid* out) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
         const RealWidth* width = FindRealWidth(length);
-        if (!width || !values || !out) return Error(kNullArgument);
+        if (!width || !values || !out) return Error(errors::kNullArgument);
         auto* real = static_cast<char*>(out);
         for (uword index = 0; index < elems; ++index, real += length) {
-            if (!values[index]) return Error(kNullArgument);
+            if (!values[index]) return Error(errors::kNullArgument);
             Status status = Refused(width->store(*values[index], real), {values[index]});
             if (!status.Ok()) return status;
         }
@@ -353,9 +353,9 @@ sword OCINumberToRealArray(OCIError* err, const OCINumber** values, uword elems,
 sword OCINumberFromText(OCIError* err, const OraText* str, ub4 strLen, const OraText* fmt, ub4 fmtLen,
                         const OraText* nls, ub4 nlsLen, OCINumber* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
-        if (!str || !out) return Error(kNullArgument);
+        if (!str || !out) return Error(errors::kNullArgument);
         const TextArgument text(error.Env(), str, strLen, false);
-        if (!text.Valid()) return Error(kMalformedText);
+        if (!text.Valid()) return Error(errors::kBadText);
         FormatArguments arguments(error.Env(), fmt, fmtLen, nls, nlsLen);
         if (const Errno problem = arguments.Resolve()) return Error(problem);
         const Errno problem = number::FromText(text.View(), arguments.Model(), arguments.Nls(), out);
@@ -366,7 +366,7 @@ sword OCINumberFromText(OCIError* err, const OraText* str, ub4 strLen, const Ora
 sword OCINumberToText(OCIError* err, const OCINumber* value, const OraText* fmt, ub4 fmtLen, const OraText* nls,
                       ub4 nlsLen, ub4* bufsize, OraText* buf) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
-        if (!value || !bufsize || !buf || *bufsize > kLargestBuffer) return Error(kNullArgument);
+        if (!value || !bufsize || !buf || *bufsize > kLargestBuffer) return Error(errors::kNullArgument);
         const Environment& environment = error.Env();
         FormatArguments arguments(environment, fmt, fmtLen, nls, nlsLen);
         if (const Errno problem = arguments.Resolve()) return Error(problem);

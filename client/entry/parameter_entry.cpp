@@ -1,16 +1,14 @@
 // OCIParamGet: the columns of a statement, and the failed rows of an array execute.
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "statements/statement.h"
 
 namespace {
 
-constexpr int kIllegalHandleType = 24316;
-constexpr int kNoParameter = 24334;
-
 // The failure at `index`, from 0, as an error handle: the one that *out points to, or a new one.
 Status GetRowFailure(ErrorHandle& error, ub4 index, dvoid** out) {
-    if (index >= error.row_failures.size()) return Error(kNoParameter);
-    if (!out) return Error(kNullArgument);
+    if (index >= error.row_failures.size()) return Error(errors::kNoParameter);
+    if (!out) return Error(errors::kNullArgument);
     auto* target = Live<ErrorHandle>(*out);
     if (!target || target == &error) target = Create<ErrorHandle>(error, OCI_HTYPE_ERROR, 0);
     const ErrorHandle::RowFailure& failure = error.row_failures[index];
@@ -32,6 +30,6 @@ sword OCIParamGet(const dvoid* hndl, ub4 type, OCIError* err, dvoid** paramOut, 
             return Enter<ErrorHandle>(hndl, err,
                                       [&](ErrorHandle& error) { return GetRowFailure(error, pos, paramOut); });
         default:
-            return Enter<Object>(hndl, err, [&](Object&) { return Error(kIllegalHandleType); });
+            return Enter<Object>(hndl, err, [&](Object&) { return Error(errors::kIllegalHandleType); });
     }
 }

@@ -2,36 +2,24 @@
 #include <string>
 
 #include "entry/text_argument.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "oci.h"
 #include "sessions/service_context.h"
 
 namespace {
 
-constexpr int kBadMode = 24300;
-constexpr int kLengthWithoutText = 24310;
-constexpr int kBadCredentials = 24323;
-constexpr int kAttachFirst = 24327;
-constexpr int kNoConnectionPool = 24392;
-constexpr int kNoSessionPool = 24416;
-constexpr int kProxyUnsupported = 24419;
-constexpr int kBadText = 24501;
-constexpr int kNoPassword = 1005;
-constexpr int kNoNewPassword = 988;
-constexpr int kBadLogon = 1017;
-constexpr int kNotConnected = 3114;
-
 constexpr ub4 kPasswordChangeLogsOn = OCI_AUTH;
 
 Status ReadText(const Environment& environment, const OraText* text, ub4 length, std::string& utf8) {
     const TextArgument in(environment, text, length, false);
-    if (!in.Valid()) return Error(kBadText);
+    if (!in.Valid()) return Error(errors::kBadText);
     utf8 = in.View();
     return {};
 }
 
 Status ReadDatabase(const Environment& environment, const OraText* text, ub4 length, std::string& database) {
-    if (!text && length != 0) return Error(kLengthWithoutText);
+    if (!text && length != 0) return Error(errors::kLengthWithoutText);
     return ReadText(environment, text, length, database);
 }
 
@@ -39,8 +27,8 @@ Status ReadDatabase(const Environment& environment, const OraText* text, ub4 len
 Status CheckCredentials(engine::Credentials& credentials) {
     credentials.external = credentials.user.empty() && credentials.password.empty();
     if (credentials.external) return {};
-    if (credentials.user.empty()) return Error(kBadLogon);
-    return credentials.password.empty() ? Error(kNoPassword) : Status();
+    if (credentials.user.empty()) return Error(errors::kBadLogon);
+    return credentials.password.empty() ? Error(errors::kNoPassword) : Status();
 }
 
 Status ReadCredentials(const Environment& environment, const OraText* user, ub4 user_length, const OraText* password,
@@ -51,10 +39,10 @@ Status ReadCredentials(const Environment& environment, const OraText* user, ub4 
 }
 
 Status CheckLogonMode(ub4 mode) {
-    if (mode & OCI_LOGON2_CPOOL) return Error(kNoConnectionPool);
-    if (mode & OCI_LOGON2_SPOOL) return Error(kNoSessionPool);
-    if (mode & OCI_LOGON2_PROXY) return Error(kProxyUnsupported);
-    return mode & ~static_cast<ub4>(OCI_LOGON2_STMTCACHE) ? Error(kBadMode) : Status();
+    if (mode & OCI_LOGON2_CPOOL) return Error(errors::kNoConnectionPool);
+    if (mode & OCI_LOGON2_SPOOL) return Error(errors::kNoSessionPool);
+    if (mode & OCI_LOGON2_PROXY) return Error(errors::kProxyUnsupported);
+    return mode & ~static_cast<ub4>(OCI_LOGON2_STMTCACHE) ? Error(errors::kBadMode) : Status();
 }
 
 struct LogonTexts {
@@ -68,7 +56,7 @@ struct LogonTexts {
 
 // Logs on in the context that *out points to, or in a new one, which a failure takes away again.
 Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts, ub4 mode) {
-    if (!out) return Error(kNullArgument);
+    if (!out) return Error(errors::kNullArgument);
     Status status = CheckLogonMode(mode);
     if (status.Failed()) return status;
     engine::Credentials credentials;
@@ -99,10 +87,10 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
 
 Status BeginSession(ServiceContext& service, Session& session, ub4 kind, ub4 mode) {
     Server* server = service.GetServer();
-    if (!server || !server->Attached()) return Error(kAttachFirst);
+    if (!server || !server->Attached()) return Error(errors::kAttachFirst);
     engine::Credentials credentials{session.user, session.password, kind == OCI_CRED_EXT};
-    if (kind == OCI_CRED_PROXY) return Error(kProxyUnsupported);
-    if (kind != OCI_CRED_RDBMS && kind != OCI_CRED_EXT) return Error(kBadCredentials);
+    if (kind == OCI_CRED_PROXY) return Error(errors::kProxyUnsupported);
+    if (kind != OCI_CRED_RDBMS && kind != OCI_CRED_EXT) return Error(errors::kBadCredentials);
     Status status = credentials.external ? Status() : CheckCredentials(credentials);
     if (status.Ok()) status = session.Begin(*server, credentials);
     if (status.Ok() && mode & OCI_STMT_CACHE && service.statement_cache_size == 0) {
@@ -140,16 +128,16 @@ struct PasswordTexts {
 };
 
 Status ChangePassword(ServiceContext& service, PasswordTexts& texts, ub4 mode) {
-    if (texts.new_password.empty()) return Error(kNoNewPassword);
+    if (texts.new_password.empty()) return Error(errors::kNoNewPassword);
     if (mode & kPasswordChangeLogsOn) {
-        if (texts.user.empty()) return Error(kBadLogon);
+        if (texts.user.empty()) return Error(errors::kBadLogon);
         return ChangePasswordAndLogOn(service, texts.user, texts.old_password, texts.new_password);
     }
     std::shared_ptr<Link> link;
     Status status = service.Require(link);
     if (status.Failed()) return status;
     if (texts.user.empty()) texts.user = link->user;
-    if (texts.user.empty()) return Error(kBadLogon);
+    if (texts.user.empty()) return Error(errors::kBadLogon);
     return link->Engine().ChangePassword(texts.user, texts.old_password, texts.new_password);
 }
 
@@ -160,7 +148,7 @@ Status VersionText(Object& object, std::string& text) {
         Status status = service->RequireServer(server);
         if (status.Failed()) return status;
     }
-    if (!server->Attached()) return Error(kNotConnected);
+    if (!server->Attached()) return Error(errors::kNotConnected);
     text = server->Version();
     return {};
 }
@@ -178,7 +166,7 @@ sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
             return {};
         }
         if (!server) return InvalidHandle();
-        if (!server->Attached()) return Error(kNotConnected);
+        if (!server->Attached()) return Error(errors::kNotConnected);
         for (const std::shared_ptr<Link>& link : server->Links()) act(*link);
         return {};
     });
@@ -204,9 +192,9 @@ sword OCILogoff(OCISvcCtx* svc, OCIError* err) {
 
 sword OCIServerAttach(OCIServer* srv, OCIError* err, const OraText* db, sb4 dbLen, ub4 mode) {
     return Enter<Server>(srv, err, [&](Server& server) -> Status {
-        if (mode & OCI_CPOOL) return Error(kNoConnectionPool);
-        if (mode != OCI_DEFAULT) return Error(kBadMode);
-        if (dbLen < 0) return Error(kNullArgument);
+        if (mode & OCI_CPOOL) return Error(errors::kNoConnectionPool);
+        if (mode != OCI_DEFAULT) return Error(errors::kBadMode);
+        if (dbLen < 0) return Error(errors::kNullArgument);
         std::string database;
         Status status = ReadDatabase(server.Env(), db, static_cast<ub4>(dbLen), database);
         return status.Ok() ? server.Attach(database) : status;
@@ -247,7 +235,7 @@ sword OCIPasswordChange(OCISvcCtx* svc, OCIError* err, const OraText* user, ub4 
 sword OCIServerVersion(dvoid* hndl, OCIError* err, OraText* buf, ub4 bufsize, ub1 type) {
     return Enter<Object>(hndl, err, [&](Object& object) -> Status {
         if (object.Type() != type || (type != OCI_HTYPE_SVCCTX && type != OCI_HTYPE_SERVER)) return InvalidHandle();
-        if (!buf || bufsize == 0) return Error(kNullArgument);
+        if (!buf || bufsize == 0) return Error(errors::kNullArgument);
         std::string text;
         Status status = VersionText(object, text);
         if (status.Ok()) TextToBuffer(object.Env(), text, buf, bufsize);    // cut to what fits

@@ -1,5 +1,6 @@
 // Statements: prepare, release, execute, fetch, result sets, bind information, pieces.
 #include "entry/text_argument.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "sessions/service_context.h"
 #include "statements/result_set.h"
@@ -8,36 +9,29 @@
 
 namespace {
 
-constexpr int kBadMode = 24300;
-constexpr int kBadResultSet = 24336;
-constexpr int kNoText = 24373;
-constexpr int kIllegalOperation = 24370;
-constexpr int kFromPrepare2 = 24433;
-constexpr int kBadText = 24501;
-
 Status CheckSyntax(ub4 language) {
     const bool known = language == OCI_NTV_SYNTAX || language == OCI_V7_SYNTAX || language == OCI_V8_SYNTAX;
-    return known ? Status() : Error(kBadMode);
+    return known ? Status() : Error(errors::kBadMode);
 }
 
 Status Prepare(Statement& statement, const OraText* sql, ub4 length, ub4 language, ub4 mode) {
-    if (statement.from_prepare2) return Error(kFromPrepare2);
-    if (!sql || length == 0) return Error(kNoText);
+    if (statement.from_prepare2) return Error(errors::kFromPrepare2);
+    if (!sql || length == 0) return Error(errors::kNoText);
     if (Status status = CheckSyntax(language); !status.Ok()) return status;
-    if (mode & ~ub4{OCI_UTF16}) return Error(kBadMode);
+    if (mode & ~ub4{OCI_UTF16}) return Error(errors::kBadMode);
     const TextArgument text(statement.Env(), sql, length, mode & OCI_UTF16);
-    if (!text.Valid()) return Error(kBadText);
-    return text.View().empty() ? Error(kNoText) : statement.Prepare(text.View());
+    if (!text.Valid()) return Error(errors::kBadText);
+    return text.View().empty() ? Error(errors::kNoText) : statement.Prepare(text.View());
 }
 
 Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 length, const OraText* key,
                 ub4 key_length, ub4 language, ub4 mode) {
-    if (!out) return Error(kNullArgument);
+    if (!out) return Error(errors::kNullArgument);
     if (Status status = CheckSyntax(language); !status.Ok()) return status;
-    if (mode & ~ub4{OCI_PREP2_CACHE_SEARCHONLY | OCI_UTF16}) return Error(kBadMode);
+    if (mode & ~ub4{OCI_PREP2_CACHE_SEARCHONLY | OCI_UTF16}) return Error(errors::kBadMode);
     const TextArgument text(service.Env(), sql, length, mode & OCI_UTF16);
     const TextArgument tag(service.Env(), key, key_length, mode & OCI_UTF16);
-    if (!text.Valid() || !tag.Valid()) return Error(kBadText);
+    if (!text.Valid() || !tag.Valid()) return Error(errors::kBadText);
     Statement* statement = nullptr;
     const bool search_only = mode & OCI_PREP2_CACHE_SEARCHONLY;
     Status status = PrepareThroughCache(service, {text.View(), tag.View(), search_only}, statement);
@@ -46,22 +40,22 @@ Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 
 }
 
 Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length, ub4 mode) {
-    if (mode & ~ub4{OCI_STRLS_CACHE_DELETE}) return Error(kBadMode);
+    if (mode & ~ub4{OCI_STRLS_CACHE_DELETE}) return Error(errors::kBadMode);
     const TextArgument tag(statement.Env(), key, key_length, false);
-    if (!tag.Valid()) return Error(kBadText);
+    if (!tag.Valid()) return Error(errors::kBadText);
     return Release(statement, tag.View(), !(mode & OCI_STRLS_CACHE_DELETE));
 }
 
 sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
-        return mode == OCI_DEFAULT ? statement.Fetch(rows, orientation, offset) : Error(kBadMode);
+        return mode == OCI_DEFAULT ? statement.Fetch(rows, orientation, offset) : Error(errors::kBadMode);
     });
 }
 
 template <class Area>
 sword SetPiece(dvoid* handle, OCIError* err, const PieceBuffer& piece) {
     return Enter<Area>(handle, err, [&](Area& area) {
-        return area.statement ? area.statement->SetPieceInfo(area, piece) : Error(kIllegalOperation);
+        return area.statement ? area.statement->SetPieceInfo(area, piece) : Error(errors::kIllegalOperation);
     });
 }
 
@@ -107,7 +101,7 @@ sword OCIResultSetToStmt(OCIResult* rset, OCIError* err) {
         auto* result = Live<ResultSet>(rset);
         const Statement* statement = result ? result : Live<Statement>(rset);
         if (!statement) return InvalidHandle();
-        if (!statement->HasResult()) return Error(kBadResultSet);
+        if (!statement->HasResult()) return Error(errors::kBadResultSet);
         if (result) result->BecomeStatement();
         return Status();
     });

@@ -2,14 +2,12 @@
 #include <cstring>
 #include <memory>
 
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "text/variable.h"
 #include "values/rowid_descriptor.h"
 
 namespace {
-
-constexpr int kInvalidRowId = 1410;
-constexpr int kBufferTooSmall = 22059;
 
 template <class Handle> struct ClassOf;
 template <> struct ClassOf<OCIString> { using Type = String; };
@@ -25,7 +23,7 @@ template <class Handle, class Change>
 sword ChangeAt(OCIEnv* env, OCIError* err, Handle** place, Change change) {
     using T = typename ClassOf<Handle>::Type;
     return Enter<Environment>(env, err, [&](Environment& environment) -> Status {
-        if (!place) return Error(kNullArgument);
+        if (!place) return Error(errors::kNullArgument);
         if (*place) {
             T* object = Live<T>(*place);
             return object ? change(*object) : InvalidHandle();
@@ -58,7 +56,7 @@ sword Resize(OCIEnv* env, OCIError* err, ub4 size, Handle** place) {
     using T = typename ClassOf<Handle>::Type;
     if (size > 0) return ChangeAt(env, err, place, [size](Variable& target) { return target.Resize(size); });
     return Enter<Environment>(env, err, [&](Environment&) -> Status {
-        if (!place) return Error(kNullArgument);
+        if (!place) return Error(errors::kNullArgument);
         if (!*place) return {};
         T* object = Live<T>(*place);
         if (!object) return InvalidHandle();
@@ -71,7 +69,7 @@ sword Resize(OCIEnv* env, OCIError* err, ub4 size, Handle** place) {
 template <class Handle>
 sword GetRoom(OCIEnv* env, OCIError* err, const Handle* pointer, ub4* size) {
     return Enter<Environment>(env, err, [&](Environment&) -> Status {
-        if (!pointer || !size) return Error(kNullArgument);
+        if (!pointer || !size) return Error(errors::kNullArgument);
         const auto* object = Live<typename ClassOf<Handle>::Type>(pointer);
         if (!object) return InvalidHandle();
         *size = object->Room();
@@ -101,15 +99,15 @@ ub4 Size(const OCIEnv* env, const Handle* pointer) {
 
 // The zero that closes the text is written when there is room for it.
 Status RowIdText(const RowIdDescriptor& descriptor, OraText* buf, ub2* len) {
-    if (!buf || !len) return Error(kNullArgument);
-    if (!descriptor.value) return Error(kInvalidRowId);
+    if (!buf || !len) return Error(errors::kNullArgument);
+    if (!descriptor.value) return Error(errors::kInvalidRowId);
     char text[rowid::kTextLength];
     rowid::ToText(*descriptor.value, text);
     std::string converted;
     const std::string_view shown = TextOut(descriptor.Env(), {text, sizeof text}, converted);
     const std::size_t room = *len;
     *len = static_cast<ub2>(shown.size());
-    if (room < shown.size()) return Error(kBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
+    if (room < shown.size()) return Error(errors::kBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
     shown.copy(reinterpret_cast<char*>(buf), shown.size());
     const std::size_t terminator = descriptor.Env().Utf16() ? 2 : 1;
     if (room - shown.size() >= terminator) std::memset(buf + shown.size(), 0, terminator);

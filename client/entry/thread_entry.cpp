@@ -1,4 +1,5 @@
 // The thread package.
+#include "handles/errors.h"
 #include "handles/package.h"
 #include "threads/thread.h"
 
@@ -11,12 +12,12 @@ template <> struct ClassOf<OCIThreadId> { using Type = ThreadId; };
 template <> struct ClassOf<OCIThreadHandle> { using Type = ThreadHandle; };
 template <class Handle> using Class = typename ClassOf<Handle>::Type;
 
-constinit Package the_package{kNullArgument, "the thread package is not initialised"};
+constinit Package the_package{errors::kNullArgument, "the thread package is not initialised"};
 
 // An object that must be given. What is no living one is refused like any bad handle.
 template <class Handle>
 Status Find(Handle* pointer, Class<Handle>*& object) {
-    if (!pointer) return Error(kNullArgument);
+    if (!pointer) return Error(errors::kNullArgument);
     object = Live<Class<Handle>>(pointer);
     return object ? Status() : InvalidHandle();
 }
@@ -45,7 +46,7 @@ sword EnterObjects(void* handle, OCIError* err, Handle* first, Handle* second, B
 template <class Handle, class... Arguments>
 sword Make(void* handle, OCIError* err, Handle** place, Arguments... arguments) {
     return the_package.Enter(handle, err, [&](Environment& environment) -> Status {
-        if (!place || Live<Class<Handle>>(*place)) return Error(kNullArgument);
+        if (!place || Live<Class<Handle>>(*place)) return Error(errors::kNullArgument);
         *place = AsHandle<Handle>(Create<Class<Handle>>(environment, 0, 0, arguments...));
         return {};
     });
@@ -55,7 +56,7 @@ sword Make(void* handle, OCIError* err, Handle** place, Arguments... arguments) 
 template <class Handle, class Check>
 sword Unmake(void* handle, OCIError* err, Handle** place, Check check) {
     return the_package.Enter(handle, err, [&](Environment&) -> Status {
-        if (!place) return Error(kNullArgument);
+        if (!place) return Error(errors::kNullArgument);
         Class<Handle>* object = nullptr;
         Status status = Find(*place, object);
         if (status.Ok()) status = check(*object);
@@ -78,7 +79,7 @@ Status FindOptional(Handle* pointer, Class<Handle>*& object) {
 }
 
 Status Start(void (*start)(dvoid*), dvoid* argument, OCIThreadId* tid, OCIThreadHandle* th) {
-    if (!start) return Error(kNullArgument);
+    if (!start) return Error(errors::kNullArgument);
     ThreadId* id = nullptr;
     ThreadHandle* handle = nullptr;
     Status found = FindOptional(tid, id);
@@ -127,7 +128,7 @@ sword OCIThreadKeySet(dvoid* hndl, OCIError* err, OCIThreadKey* key, dvoid* valu
 
 sword OCIThreadKeyGet(dvoid* hndl, OCIError* err, OCIThreadKey* key, dvoid** value) {
     return EnterObject(hndl, err, key, [value](const ThreadKey& object) -> Status {
-        if (!value) return Error(kNullArgument);
+        if (!value) return Error(errors::kNullArgument);
         *value = object.Get();
         return {};
     });
@@ -153,7 +154,7 @@ sword OCIThreadIdGet(dvoid* hndl, OCIError* err, OCIThreadId* tid) {
 
 sword OCIThreadIdSame(dvoid* hndl, OCIError* err, OCIThreadId* tid1, OCIThreadId* tid2, boolean* same) {
     return EnterObjects(hndl, err, tid1, tid2, [same](const ThreadId& left, const ThreadId& right) -> Status {
-        if (!same) return Error(kNullArgument);
+        if (!same) return Error(errors::kNullArgument);
         *same = left.number == right.number;
         return {};
     });
@@ -161,7 +162,7 @@ sword OCIThreadIdSame(dvoid* hndl, OCIError* err, OCIThreadId* tid1, OCIThreadId
 
 sword OCIThreadIdNull(dvoid* hndl, OCIError* err, OCIThreadId* tid, boolean* isNull) {
     return EnterObject(hndl, err, tid, [isNull](const ThreadId& id) -> Status {
-        if (!isNull) return Error(kNullArgument);
+        if (!isNull) return Error(errors::kNullArgument);
         *isNull = id.number == 0;
         return {};
     });

@@ -10,29 +10,28 @@
 #include <limits>
 #include <system_error>
 
+#include "handles/errors.h"
 #include "oci_constants.h"
 
 namespace {
 
-constexpr int kCannotAccess = 30160;
-constexpr int kAccessDenied = 30157;
-constexpr int kIsDirectory = 30158;
-
 // What the system says and the number it gets; anything else is kCannotAccess.
 constexpr struct { int error; int number; } kSystemErrors[] = {
-    {EINVAL, kInvalidFileArgument}, {EEXIST, 30151}, {ENOENT, 30152}, {EIO, 30155}, {ENOSPC, 30156}, {EDQUOT, 30156},
-    {EACCES, kAccessDenied}, {EPERM, kAccessDenied}, {EROFS, kAccessDenied}, {EISDIR, kIsDirectory}, {EFBIG, 30159},
-    {EOVERFLOW, 30159}};
+    {EINVAL, errors::kInvalidFileArgument}, {EEXIST, errors::kFileExists},    {ENOENT, errors::kNoSuchFile},
+    {EIO, errors::kFileInputOutput},        {ENOSPC, errors::kFileNoSpace},   {EDQUOT, errors::kFileNoSpace},
+    {EACCES, errors::kAccessDenied},        {EPERM, errors::kAccessDenied},   {EROFS, errors::kAccessDenied},
+    {EISDIR, errors::kIsDirectory},         {EFBIG, errors::kFileTooLarge},
+    {EOVERFLOW, errors::kFileTooLarge}};
 
 Status SystemError(const std::string& name, int error) {
-    int number = kCannotAccess;
+    int number = errors::kCannotAccess;
     for (const auto& row : kSystemErrors) {
         if (row.error == error) number = row.number;
     }
     return Error(number, name + ": " + std::system_category().message(error));
 }
 
-Status InvalidArgument(const char* what) { return Error(kInvalidFileArgument, what); }
+Status InvalidArgument(const char* what) { return Error(errors::kInvalidFileArgument, what); }
 
 // By open mode. A stream that appends must know, or it takes its position for another after it has written.
 constexpr const char* kStreamModes[] = {nullptr, "r", "w", "r+"};
@@ -106,7 +105,7 @@ void File::Turn(Last next) {
 
 Status File::Read(void* buffer, std::uint32_t size, std::uint32_t* count) {
     const std::lock_guard lock(mutex_);
-    if (!readable_) return Error(kAccessDenied, name_ + ": not open for reading");
+    if (!readable_) return Error(errors::kAccessDenied, name_ + ": not open for reading");
     Turn(Last::read);
     errno = 0;
     *count = static_cast<std::uint32_t>(std::fread(buffer, 1, size, stream_));
@@ -118,7 +117,7 @@ Status File::Read(void* buffer, std::uint32_t size, std::uint32_t* count) {
 
 Status File::Write(const void* data, std::uint32_t size, std::uint32_t* count) {
     const std::lock_guard lock(mutex_);
-    if (!writable_) return Error(kAccessDenied, name_ + ": not open for writing");
+    if (!writable_) return Error(errors::kAccessDenied, name_ + ": not open for writing");
     Turn(Last::write);
     errno = 0;
     *count = static_cast<std::uint32_t>(std::fwrite(data, 1, size, stream_));

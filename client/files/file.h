@@ -10,9 +10,6 @@
 #include "handles/object.h"
 #include "handles/status.h"
 
-constexpr int kInvalidFileArgument = 30150;
-constexpr int kInvalidFileObject = 30153;
-
 class File : public Object {
 public:
     static constexpr Kind kKind = Kind::file;

@@ -4,12 +4,10 @@
 #include <cstring>
 
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 
 namespace {
-
-constexpr int kUnknownAttribute = 24315;
-constexpr int kBadValue = 24328;
 
 Status EnvironmentOf(Object& object, AttributeValue& value) {
     value.pointer = &object.Env();
@@ -97,8 +95,8 @@ void StoreValue(Object& object, const AttributeRow& row, const AttributeValue& v
 
 Status GetAttribute(Object& object, void* target, std::uint32_t* size, std::uint32_t attribute) {
     const AttributeRow* row = Find(object, attribute);
-    if (!row || !row->get) return Error(kUnknownAttribute);
-    if (!target) return Error(kNullArgument);
+    if (!row || !row->get) return Error(errors::kUnknownAttribute);
+    if (!target) return Error(errors::kNullArgument);
     AttributeValue value;
     if (row->shape == Shape::descriptor) value.pointer = target;
     Status status = row->get(object, value);
@@ -108,21 +106,21 @@ Status GetAttribute(Object& object, void* target, std::uint32_t* size, std::uint
 
 Status SetAttribute(Object& object, const void* source, std::uint32_t size, std::uint32_t attribute) {
     const AttributeRow* row = Find(object, attribute);
-    if (!row || !row->set) return Error(kUnknownAttribute);
-    if (row->size != 0 && size != row->size) return Error(kBadValue);
+    if (!row || !row->set) return Error(errors::kUnknownAttribute);
+    if (row->size != 0 && size != row->size) return Error(errors::kBadValue);
     AttributeValue value;
     if (row->shape == Shape::handle || row->shape == Shape::descriptor) {
         value.pointer = const_cast<void*>(source);
         return row->set(object, value);
     }
     if (row->shape == Shape::text) {
-        if (!source && size > 0) return Error(kBadValue);
+        if (!source && size > 0) return Error(errors::kBadValue);
         const TextIn text(object.Env(), source, size);
-        if (!text.Valid()) return Error(24501);
+        if (!text.Valid()) return Error(errors::kBadText);
         value.text = text.View();
         return row->set(object, value);
     }
-    if (!source) return Error(kBadValue);
+    if (!source) return Error(errors::kBadValue);
     if (row->shape == Shape::bytes) value.text = {static_cast<const char*>(source), size};
     else value.integer = LoadInteger(source, Width(row->shape));
     return row->set(object, value);

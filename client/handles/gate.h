@@ -13,12 +13,9 @@
 
 #include "handles/environment.h"
 #include "handles/error_handle.h"
+#include "handles/errors.h"
 #include "handles/in_flight.h"
 #include "oci.h"
-
-constexpr int kOutOfMemory = 1019;
-constexpr int kInternalError = 600;
-constexpr int kNullArgument = 21560;    // an argument is null or out of range
 
 // Adds the record of a status and answers its return code.
 inline sword Record(ErrorList& list, const Status& status) noexcept {
@@ -33,11 +30,11 @@ sword Guard(ErrorList& list, Body&& body) noexcept {
         const Status status = body();
         return status.Ok() ? OCI_SUCCESS : Record(list, status);
     } catch (const std::bad_alloc&) {
-        return Record(list, Error(kOutOfMemory));
+        return Record(list, Error(errors::kOutOfMemory));
     } catch (const std::exception& failure) {
-        return Record(list, Error(kInternalError, failure.what()));
+        return Record(list, Error(errors::kInternalError, failure.what()));
     } catch (...) {
-        return Record(list, Error(kInternalError));
+        return Record(list, Error(errors::kInternalError));
     }
 }
 

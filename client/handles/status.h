@@ -6,6 +6,8 @@
 #include <string>
 #include <utility>
 
+#include "handles/errors.h"
+
 class [[nodiscard]] Status {
 public:
     Status() = default;    // success
@@ -40,6 +42,6 @@ inline Status Error(int number) { return {-1, number}; }
 inline Status Error(int number, std::string detail) { return {-1, number, std::move(detail)}; }
 inline Status Warning(int number) { return {1, number}; }
 inline Status Warning(int number, std::string detail) { return {1, number, std::move(detail)}; }
-inline Status NoData() { return {100, 1403}; }
+inline Status NoData() { return {100, errors::kNoRows}; }
 inline Status NeedData(int number) { return {99, number}; }
 inline Status InvalidHandle() { return {-2, 0}; }

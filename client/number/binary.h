@@ -4,6 +4,7 @@
 
 #include <mpfr.h>
 
+#include "handles/errors.h"
 #include "number/digits.h"
 #include "number/number.h"
 
@@ -52,15 +53,15 @@ template <class Compute> Errno Evaluate(Compute compute, OCINumber* result) {
         mpfr_clear_flags();
         Real real(precision);
         const mpfr_prec_t good_bits = compute(precision, &real);
-        if (real.IsNan()) return kBadNumber;
+        if (real.IsNan()) return errors::kBadNumber;
         if (real.IsZero()) {
-            if (mpfr_underflow_p()) return kUnderflow;
+            if (mpfr_underflow_p()) return errors::kNumberUnderflow;
             SetZero(result);
             return 0;
         }
         constexpr mpfr_exp_t kBeyond = 450;  // 2^420 is 1E126
-        if (real.IsInfinite() || real.Exponent() > kBeyond) return kOverflow;
-        if (real.Exponent() < -kBeyond) return kUnderflow;
+        if (real.IsInfinite() || real.Exponent() > kBeyond) return errors::kNumberOverflow;
+        if (real.Exponent() < -kBeyond) return errors::kNumberUnderflow;
         Digits digits;
         if (ToDigits(real, good_bits, precision > kLastPrecision, &digits)) return Pack(digits, result);
     }

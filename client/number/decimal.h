@@ -6,6 +6,7 @@
 #include <cstring>
 #include <string_view>
 
+#include "handles/errors.h"
 #include "number/digits.h"
 #include "number/number.h"
 
@@ -88,8 +89,8 @@ void PutExponent(int exponent, Writer* out);
 // Reads E, sign and digits; where they are missing, leaves *exponent and the position alone.
 const char* ReadExponent(const char* at, const char* end, int* exponent);
 
-// Reads blanks, sign, digits with a point, exponent, blanks; false when the text is anything else. *error is kOverflow
-// or kUnderflow for a number out of range.
+// Reads blanks, sign, digits with a point, exponent, blanks; false when the text is anything else. *error is
+// kNumberOverflow or kNumberUnderflow for a number out of range.
 bool ReadPlain(std::string_view text, char decimal, OCINumber* result, Errno* error) noexcept;
 
 }  // namespace number

@@ -1,6 +1,7 @@
 // Decimal floating point of 8 and 16 bytes: sign, exponent and an integer coefficient.
 #include "number/decimal_float.h"
 
+#include "handles/errors.h"
 #include "number/decimal.h"
 
 namespace number {
@@ -76,7 +77,7 @@ void StoreBits(Wide bits, std::size_t size, void* bytes) {
 Errno FromDecimalFloat(const void* bytes, std::size_t size, OCINumber* result) noexcept {
     const Form& form = size == kDecimal64Size ? kForm64 : kForm128;
     const Parts parts = Split(LoadBits(bytes, size), form);
-    if (parts.special) return parts.nan ? kBadNumber : kOverflow;
+    if (parts.special) return parts.nan ? errors::kBadNumber : errors::kNumberOverflow;
     char text[kMaxDigits];
     char* at = text + sizeof text;
     for (Wide rest = parts.coefficient; rest != 0; rest /= 10)

@@ -4,6 +4,7 @@
 
 #include <cstddef>
 
+#include "handles/errors.h"
 #include "number/number.h"
 
 namespace number {
@@ -11,8 +12,8 @@ namespace number {
 constexpr std::size_t kDecimal64Size = 8;
 constexpr std::size_t kDecimal128Size = 16;
 
-// `size` is 8 or 16; the bytes need no alignment. From: an infinity is kOverflow, a NaN kBadNumber. To: rounded half
-// away from zero to 16 or 34 digits.
+// `size` is 8 or 16; the bytes need no alignment. From: an infinity is kNumberOverflow, a NaN kBadNumber. To: rounded
+// half away from zero to 16 or 34 digits.
 Errno FromDecimalFloat(const void* bytes, std::size_t size, OCINumber* result) noexcept;
 Errno ToDecimalFloat(const OCINumber& value, std::size_t size, void* bytes) noexcept;
 

@@ -9,6 +9,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "handles/errors.h"
 #include "number/number.h"
 #include "oci.h"
 
@@ -284,7 +285,7 @@ template <bool kNegative>
     Store(bytes + 2 + carry, kNegative ? bias[0] - w[0] : bias[0] + w[0]);
 }
 
-// kBadNumber for malformed bytes, kOverflow for an infinity.
+// kBadNumber for malformed bytes, kNumberOverflow for an infinity.
 inline Errno Unpack(const OCINumber& value, Digits* digits) noexcept {
     const std::uint8_t* bytes = value.OCINumberPart;
     if (!HasMantissa(value)) return detail::UnpackRare(value, digits);
@@ -294,14 +295,15 @@ inline Errno Unpack(const OCINumber& value, Digits* digits) noexcept {
 
 void SetInfinity(bool negative, OCINumber* result) noexcept;
 
-// Writes normalized digits, of which the last four are 0. kOverflow or kUnderflow when the exponent does not fit.
+// Writes normalized digits, of which the last four are 0. kNumberOverflow or kNumberUnderflow when the exponent does
+// not fit.
 inline Errno Pack(const Digits& digits, OCINumber* result) noexcept {
     if (digits.IsZero()) {
         SetZero(result);
         return 0;
     }
-    if (digits.exponent > kMaxExponent) return kOverflow;
-    if (digits.exponent < kMinExponent) return kUnderflow;
+    if (digits.exponent > kMaxExponent) return errors::kNumberOverflow;
+    if (digits.exponent < kMinExponent) return errors::kNumberUnderflow;
     if (digits.negative)
         Encode<true>(digits, 0, result);
     else

@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <string_view>
 
+#include "handles/errors.h"
 #include "number/number.h"
 
 namespace number {

@@ -1,5 +1,7 @@
 #include "number/format_model.h"
 
+#include "handles/errors.h"
+
 namespace number {
 
 namespace {
@@ -166,7 +168,7 @@ Errno ParseFormat(std::string_view text, FormatModel* model) noexcept {
         model->kind = Kind::roman;
         model->lower_case = text[0] == 'r';
     } else if (!ParseHexadecimal(text, model)) {
-        return FixedParser(text, model).Parse() ? 0 : kBadFormat;
+        return FixedParser(text, model).Parse() ? 0 : errors::kBadNumberFormat;
     }
     return 0;
 }

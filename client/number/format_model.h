@@ -3,6 +3,7 @@
 
 #include <string_view>
 
+#include "handles/errors.h"
 #include "number/number.h"
 
 namespace number {
@@ -29,7 +30,7 @@ struct FormatModel {
     std::string_view whole;  // the elements before the point: 9, 0, comma and G count, others are passed over
 };
 
-// kBadFormat for unknown or misplaced elements. The model keeps a view of the text.
+// kBadNumberFormat for unknown or misplaced elements. The model keeps a view of the text.
 Errno ParseFormat(std::string_view text, FormatModel* model) noexcept;
 
 // Roman numerals: the largest, and how long they get.

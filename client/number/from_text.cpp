@@ -1,6 +1,7 @@
 // Text to numbers by a model.
 #include <algorithm>
 
+#include "handles/errors.h"
 #include "number/decimal.h"
 #include "number/format.h"
 #include "number/format_model.h"
@@ -19,16 +20,16 @@ public:
     Errno Read(OCINumber* result) {
         SkipBlanks();
         if (AtEnd()) {
-            if (!model_.blank_zero || text_.empty()) return kBadText;
+            if (!model_.blank_zero || text_.empty()) return errors::kBadNumberText;
             SetZero(result);
             return 0;
         }
-        if (!SignBefore() || !Whole() || !Fraction()) return kBadText;
-        if (!digits_.Any()) return kBadText;
+        if (!SignBefore() || !Whole() || !Fraction()) return errors::kBadNumberText;
+        if (!digits_.Any()) return errors::kBadNumberText;
         int exponent = 0;
         if (model_.scientific) at_ = static_cast<std::size_t>(ReadExponent(Here(), End(), &exponent) - text_.data());
         if (model_.currency == FormatModel::Currency::trailing) TakeMoney();
-        if (!SignAfter() || !AtEnd()) return kBadText;
+        if (!SignAfter() || !AtEnd()) return errors::kBadNumberText;
         const int scale = model_.point == 'V' ? model_.places_after : 0;
         return digits_.Finish(exponent - scale, negative_, result);
     }
@@ -142,14 +143,14 @@ std::string_view WithoutLeadingBlanks(std::string_view text) {
 
 Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber* result) {
     text = WithoutLeadingBlanks(text);
-    if (text.empty() || text.size() > static_cast<std::size_t>(model.places_before)) return kBadText;
+    if (text.empty() || text.size() > static_cast<std::size_t>(model.places_before)) return errors::kBadNumberText;
     OCINumber value, sixteen, digit, product;
     SetZero(&value);
     FromInt64(16, &sixteen);
     for (const char c : text) {
         const char letter = Upper(c);
         const bool is_letter = letter >= 'A' && letter <= 'F';
-        if (!IsDigit(c) && !is_letter) return kBadText;
+        if (!IsDigit(c) && !is_letter) return errors::kBadNumberText;
         FromInt64(is_letter ? letter - 'A' + 10 : c - '0', &digit);
         if (const Errno error = Mul(value, sixteen, &product)) return error;
         if (const Errno error = Add(product, digit, &value)) return error;
@@ -161,7 +162,7 @@ Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber
 // Reads what it can digit by digit; the letters must then be those that the value is spelled with.
 Errno ReadRoman(std::string_view text, OCINumber* result) {
     text = WithoutLeadingBlanks(text);
-    if (text.empty() || text.size() > kRomanWidth) return kBadText;
+    if (text.empty() || text.size() > kRomanWidth) return errors::kBadNumberText;
     char upper[kRomanWidth];
     std::transform(text.begin(), text.end(), upper, Upper);
     const std::string_view capitals(upper, text.size());
@@ -170,20 +171,20 @@ Errno ReadRoman(std::string_view text, OCINumber* result) {
     for (const RomanDigit& digit : kRomanDigits)
         for (; rest.starts_with(digit.letters); rest.remove_prefix(digit.letters.size())) value += digit.value;
     char letters[kRomanWidth];
-    if (!rest.empty() || value > kLargestRoman || SpellRoman(value, letters) != capitals) return kBadText;
+    if (!rest.empty() || value > kLargestRoman || SpellRoman(value, letters) != capitals) return errors::kBadNumberText;
     FromInt64(value, result);
     return 0;
 }
 
 Errno ReadWithoutModel(std::string_view text, const Nls& nls, OCINumber* result) {
     Errno error;
-    return ReadPlain(text, nls.decimal, result, &error) ? error : kBadText;
+    return ReadPlain(text, nls.decimal, result, &error) ? error : errors::kBadNumberText;
 }
 
 }  // namespace
 
 Errno FromText(std::string_view text, std::string_view model, const Nls& nls, OCINumber* result) noexcept {
-    if (text.empty()) return kBadText;
+    if (text.empty()) return errors::kBadNumberText;
     const bool nines = model.size() == text.size() && model.find_first_not_of('9') == std::string_view::npos;
     if (nines || model.empty()) return ReadWithoutModel(text, nls, result);
     FormatModel parsed;

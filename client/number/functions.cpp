@@ -1,5 +1,6 @@
 // Exponential, trigonometric and hyperbolic functions. Each is a row: how to compute it, which arguments it takes, and
 // how an error of the argument, which is rounded to binary, grows on the way to the result.
+#include "handles/errors.h"
 #include "number/binary.h"
 #include "number/digits.h"
 #include "number/number.h"
@@ -52,7 +53,7 @@ bool IsBeyondOne(const Digits& digits) {
 Errno Apply(const Function& function, const OCINumber& value, OCINumber* result) {
     Digits digits;
     if (const Errno error = Unpack(value, &digits)) return error;
-    if (function.to_one && IsBeyondOne(digits)) return kBadNumber;
+    if (function.to_one && IsBeyondOne(digits)) return errors::kBadNumber;
     const Exponent extra = function.extra_bits(digits.IsZero() ? 0 : RoughExponent(digits) + 1);
     return Evaluate(
         [&](mpfr_prec_t precision, Real* real) {
@@ -84,7 +85,7 @@ Errno ArcTan2(const OCINumber& y, const OCINumber& x, OCINumber* result) noexcep
     Digits y_digits, x_digits;
     if (const Errno error = Unpack(y, &y_digits)) return error;
     if (const Errno error = Unpack(x, &x_digits)) return error;
-    if (y_digits.IsZero() && x_digits.IsZero()) return kBadNumber;
+    if (y_digits.IsZero() && x_digits.IsZero()) return errors::kBadNumber;
     return Evaluate(
         [&](mpfr_prec_t precision, Real* real) {
             Real y_real(precision + 2), x_real(precision + 2);

@@ -1,6 +1,7 @@
 // Conversions from and to the integers of the machine.
 #include <limits>
 
+#include "handles/errors.h"
 #include "number/digits.h"
 #include "number/limbs.h"
 #include "number/number.h"
@@ -34,10 +35,10 @@ bool ToMagnitude(Digits* digits, std::uint64_t* magnitude) {
 
 template <class Integer> Errno ToBounded(const OCINumber& value, Integer* result) {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
-    if (IsInfinite(value)) return value.OCINumberPart[1] == 0 ? kUnderflow : kOverflow;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
+    if (IsInfinite(value)) return value.OCINumberPart[1] == 0 ? errors::kNumberUnderflow : errors::kNumberOverflow;
     const bool negative = digits.negative;
-    const Errno range = negative ? kUnderflow : kOverflow;
+    const Errno range = negative ? errors::kNumberUnderflow : errors::kNumberOverflow;
     constexpr auto kHighest = static_cast<std::uint64_t>(std::numeric_limits<Integer>::max());
     constexpr std::uint64_t kLowest = std::numeric_limits<Integer>::is_signed ? kHighest + 1 : 0;
     std::uint64_t magnitude;
@@ -95,14 +96,14 @@ Errno ToUint64(const OCINumber& value, std::uint64_t* result) noexcept { return 
 
 Errno FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept {
     const Width* width = FindWidth(length);
-    if (!width) return kBadIntegerLength;
+    if (!width) return errors::kBadIntegerLength;
     width->read[is_signed](value, result);
     return 0;
 }
 
 Errno ToInteger(const OCINumber& value, std::size_t length, bool is_signed, void* result) noexcept {
     const Width* width = FindWidth(length);
-    return width ? width->write[is_signed](value, result) : kBadIntegerLength;
+    return width ? width->write[is_signed](value, result) : errors::kBadIntegerLength;
 }
 
 }  // namespace number

@@ -1,4 +1,5 @@
 // Multiplication on limbs of 16 digits, most significant first; division on binary words, limb by limb of the quotient.
+#include "handles/errors.h"
 #include "number/digits.h"
 #include "number/limbs.h"
 #include "number/number.h"
@@ -178,7 +179,7 @@ Errno Div(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
     Digits a, b;
     if (const Errno error = Unpack(left, &a)) return error;
     if (const Errno error = Unpack(right, &b)) return error;
-    if (b.IsZero()) return kDividedByZero;
+    if (b.IsZero()) return errors::kDividedByZero;
     if (a.IsZero()) {
         SetZero(result);
         return 0;

@@ -1,4 +1,5 @@
 // The NLS text of a conversion: settings, each a name, an equals sign and a value.
+#include "handles/errors.h"
 #include "number/format.h"
 
 namespace number {
@@ -90,10 +91,10 @@ Errno ParseNls(std::string_view text, Nls* nls) noexcept {
             ++length;
         const std::string_view name = text.substr(0, length);
         text = TakeBlanks(text.substr(length));
-        if (!text.starts_with('=')) return kBadNls;
+        if (!text.starts_with('=')) return errors::kBadNls;
         text = TakeBlanks(text.substr(1));
         std::string_view value;
-        if (!TakeValue(&text, &value) || !Set(name, value, nls)) return kBadNls;
+        if (!TakeValue(&text, &value) || !Set(name, value, nls)) return errors::kBadNls;
     }
     return 0;
 }

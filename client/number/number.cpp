@@ -1,6 +1,7 @@
 // Sign, comparison and the other functions that only look at a number, and the rare cases of packing and unpacking.
 #include "number/number.h"
 
+#include "handles/errors.h"
 #include "number/digits.h"
 
 namespace number {
@@ -10,19 +11,19 @@ namespace detail {
 Errno UnpackRare(const OCINumber& value, Digits* digits) noexcept {
     const std::uint8_t* bytes = value.OCINumberPart;
     *digits = Digits{};
-    if (IsInfinite(value)) return kOverflow;
-    if (bytes[0] == 1) return bytes[1] == 128 ? 0 : kBadNumber;
-    if (bytes[0] == 0 || bytes[0] > kMantissaDigits + 1) return kBadNumber;
+    if (IsInfinite(value)) return errors::kNumberOverflow;
+    if (bytes[0] == 1) return bytes[1] == 128 ? 0 : errors::kBadNumber;
+    if (bytes[0] == 0 || bytes[0] > kMantissaDigits + 1) return errors::kBadNumber;
     const bool negative = bytes[1] < 128;
     int count = bytes[0] - 1;
     if (negative && bytes[1 + count] == kTerminator) --count;
-    if (count == 0) return kBadNumber;
+    if (count == 0) return errors::kBadNumber;
     Digits raw;
     raw.exponent = negative ? 62 - bytes[1] : bytes[1] - 193;
     raw.negative = negative;
     for (int i = 0; i < count; ++i) {
         const int digit = negative ? 101 - bytes[2 + i] : bytes[2 + i] - 1;
-        if (digit < 0 || digit > 99) return kBadNumber;
+        if (digit < 0 || digit > 99) return errors::kBadNumber;
         const auto place = static_cast<unsigned>(i);
         raw.words[place / 8] |= static_cast<std::uint64_t>(digit) << (56 - place % 8 * 8);
     }
@@ -44,7 +45,7 @@ bool IsNegativeInfinity(const OCINumber& value) { return value.OCINumberPart[1] 
 
 bool IsValid(const OCINumber& value) noexcept {
     Digits digits;
-    return Unpack(value, &digits) != kBadNumber;
+    return Unpack(value, &digits) != errors::kBadNumber;
 }
 
 void SetInfinity(bool negative, OCINumber* result) noexcept {
@@ -59,14 +60,14 @@ void SetPi(OCINumber* result) noexcept {
 }
 
 Errno Assign(const OCINumber& value, OCINumber* result) noexcept {
-    if (!IsValid(value)) return kBadNumber;
+    if (!IsValid(value)) return errors::kBadNumber;
     *result = value;
     return 0;
 }
 
 Errno Abs(const OCINumber& value, OCINumber* result) noexcept {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
     if (IsInfinite(value)) {
         SetInfinity(false, result);
         return 0;
@@ -77,7 +78,7 @@ Errno Abs(const OCINumber& value, OCINumber* result) noexcept {
 
 Errno Neg(const OCINumber& value, OCINumber* result) noexcept {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
     if (IsInfinite(value)) {
         SetInfinity(!IsNegativeInfinity(value), result);
         return 0;
@@ -88,7 +89,7 @@ Errno Neg(const OCINumber& value, OCINumber* result) noexcept {
 
 Errno Compare(const OCINumber& left, const OCINumber& right, int* result) noexcept {
     Digits a, b;
-    if (Unpack(left, &a) == kBadNumber || Unpack(right, &b) == kBadNumber) return kBadNumber;
+    if (Unpack(left, &a) == errors::kBadNumber || Unpack(right, &b) == errors::kBadNumber) return errors::kBadNumber;
     const auto rank = [](const OCINumber& value, const Digits& digits) {
         if (IsInfinite(value)) return IsNegativeInfinity(value) ? -2 : 2;
         return digits.IsZero() ? 0 : digits.negative ? -1 : 1;
@@ -105,7 +106,7 @@ Errno Compare(const OCINumber& left, const OCINumber& right, int* result) noexce
 
 Errno Sign(const OCINumber& value, int* result) noexcept {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
     if (IsInfinite(value))
         *result = IsNegativeInfinity(value) ? -1 : 1;
     else
@@ -115,14 +116,14 @@ Errno Sign(const OCINumber& value, int* result) noexcept {
 
 Errno IsInt(const OCINumber& value, int* result) noexcept {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
     *result = !IsInfinite(value) && (digits.IsZero() || IsWhole(digits));
     return 0;
 }
 
 Errno IsZero(const OCINumber& value, int* result) noexcept {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
     *result = !IsInfinite(value) && digits.IsZero();
     return 0;
 }

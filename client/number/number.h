@@ -11,26 +11,12 @@
 #include <cstdint>
 #include <string_view>
 
+#include "handles/errors.h"
 #include "oci.h"
 
 namespace number {
 
 using Errno = int;  // a published error number; 0: success
-
-constexpr Errno kInvalidNumber = 1722;    // plain text that is no number
-constexpr Errno kNumericOverflow = 1426;  // plain text of a number out of range
-constexpr Errno kBadArgument = 21560;     // an argument is null or out of range
-constexpr Errno kOverflow = 22053;        // 1E126 and above; also arithmetic with an infinity
-constexpr Errno kUnderflow = 22054;       // not zero, but below 1E-130
-constexpr Errno kBadSignFlag = 22055;
-constexpr Errno kDividedByZero = 22056;
-constexpr Errno kBadIntegerLength = 22057;
-constexpr Errno kBufferTooSmall = 22059;
-constexpr Errno kBadNumber = 22060;  // malformed, or outside the domain of the function
-constexpr Errno kBadFormat = 22061;
-constexpr Errno kBadText = 22062;  // does not fit the format
-constexpr Errno kBadNls = 22064;
-constexpr Errno kRoundingOverflow = 22065;  // fits the format before rounding only
 
 constexpr int kMaxDigits = 40;  // decimal digits of a number, at most
 
@@ -88,7 +74,8 @@ Errno HypSin(const OCINumber& value, OCINumber* result) noexcept;
 Errno HypCos(const OCINumber& value, OCINumber* result) noexcept;
 Errno HypTan(const OCINumber& value, OCINumber* result) noexcept;
 
-// Integers. A fraction is dropped; what does not fit is kOverflow or kUnderflow (too small, negative into unsigned).
+// Integers. A fraction is dropped; what does not fit is kNumberOverflow or kNumberUnderflow (too small, negative into
+// unsigned).
 void FromInt64(std::int64_t value, OCINumber* result) noexcept;
 void FromUint64(std::uint64_t value, OCINumber* result) noexcept;
 Errno ToInt64(const OCINumber& value, std::int64_t* result) noexcept;
@@ -97,8 +84,8 @@ Errno ToUint64(const OCINumber& value, std::uint64_t* result) noexcept;
 Errno FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept;
 Errno ToInteger(const OCINumber& value, std::size_t length, bool is_signed, void* result) noexcept;
 
-// Reals. From: the shortest decimal that reads back as the same real; an infinity is kOverflow, a NaN kBadNumber. To:
-// the nearest real, ties to even; infinities stay so. What becomes zero or infinite only by its size is an error.
+// Reals. From: the shortest decimal that reads back as the same real; an infinity is kNumberOverflow, a NaN kBadNumber.
+// To: the nearest real, ties to even; infinities stay so. What becomes zero or infinite only by its size is an error.
 Errno FromFloat(float value, OCINumber* result) noexcept;
 Errno FromDouble(double value, OCINumber* result) noexcept;
 Errno FromLongDouble(long double value, OCINumber* result) noexcept;

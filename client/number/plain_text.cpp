@@ -1,4 +1,5 @@
 // Numbers to and from text without a format.
+#include "handles/errors.h"
 #include "number/decimal.h"
 
 namespace number {
@@ -103,16 +104,16 @@ bool ReadPlain(std::string_view text, char decimal, OCINumber* result, Errno* er
 
 Errno FromPlainText(std::string_view text, char decimal, OCINumber* result) noexcept {
     Errno error;
-    if (!ReadPlain(text, decimal, result, &error)) return kInvalidNumber;
-    if (error == kUnderflow) SetZero(result);
-    return error == kOverflow ? kNumericOverflow : 0;
+    if (!ReadPlain(text, decimal, result, &error)) return errors::kInvalidNumber;
+    if (error == errors::kNumberUnderflow) SetZero(result);
+    return error == errors::kNumberOverflow ? errors::kNumericOverflow : 0;
 }
 
 Errno ToPlainText(const OCINumber& value, char decimal, char* text, std::size_t* length) noexcept {
     Digits digits;
     Writer out(text, kMaxPlainText);
     if (const Errno error = Unpack(value, &digits)) {
-        if (error == kBadNumber) return error;
+        if (error == errors::kBadNumber) return error;
         if (value.OCINumberPart[1] == 0) out.Put('-');
         out.Put('~');
     } else {

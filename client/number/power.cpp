@@ -1,4 +1,5 @@
 // Logarithms and powers.
+#include "handles/errors.h"
 #include "number/binary.h"
 #include "number/digits.h"
 #include "number/number.h"
@@ -29,7 +30,7 @@ void NaturalLogarithm(const OCINumber& value, const Digits& digits, Real* real) 
 
 Errno UnpackPositive(const OCINumber& value, Digits* digits) {
     if (const Errno error = Unpack(value, digits)) return error;
-    return digits->IsZero() || digits->negative ? kBadNumber : 0;
+    return digits->IsZero() || digits->negative ? errors::kBadNumber : 0;
 }
 
 bool IsOdd(const Digits& digits) {
@@ -62,11 +63,11 @@ Errno PowerOf(const Digits& base, const Digits& exponent, bool whole_exponent, O
         return 0;
     }
     if (base.IsZero()) {
-        if (exponent.negative) return kDividedByZero;
+        if (exponent.negative) return errors::kDividedByZero;
         SetZero(result);
         return 0;
     }
-    if (base.negative && !whole_exponent) return kBadNumber;
+    if (base.negative && !whole_exponent) return errors::kBadNumber;
     return Raise(base, exponent, result);
 }
 

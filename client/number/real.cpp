@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <limits>
 
+#include "handles/errors.h"
 #include "number/decimal.h"
 #include "number/number.h"
 
@@ -16,20 +17,20 @@ constexpr std::size_t kMaxText = 64;
 
 // With the digits that tell it from other reals, or with so many places after the first digit.
 template <class Real, class... Places> Errno FromReal(Real value, OCINumber* result, Places... places) {
-    if (std::isnan(value)) return kBadNumber;
-    if (std::isinf(value)) return kOverflow;
+    if (std::isnan(value)) return errors::kBadNumber;
+    if (std::isinf(value)) return errors::kNumberOverflow;
     char text[kMaxText];
     const auto end = std::to_chars(text, text + sizeof text, value, std::chars_format::scientific, places...).ptr;
     Errno error;
-    if (!ReadPlain({text, static_cast<std::size_t>(end - text)}, '.', result, &error)) return kBadNumber;
+    if (!ReadPlain({text, static_cast<std::size_t>(end - text)}, '.', result, &error)) return errors::kBadNumber;
     return error;
 }
 
 Errno Read(const char* text, const char* end, double* value) {
-    return std::from_chars(text, end, *value).ec == std::errc{} ? 0 : kOverflow;
+    return std::from_chars(text, end, *value).ec == std::errc{} ? 0 : errors::kNumberOverflow;
 }
 Errno Read(const char* text, const char* end, float* value) {
-    return std::from_chars(text, end, *value).ec == std::errc{} ? 0 : kOverflow;
+    return std::from_chars(text, end, *value).ec == std::errc{} ? 0 : errors::kNumberOverflow;
 }
 Errno Read(const char* text, const char*, long double* value) {
     *value = std::strtold(text, nullptr);
@@ -38,7 +39,7 @@ Errno Read(const char* text, const char*, long double* value) {
 
 template <class Real> Errno ToReal(const OCINumber& value, Real* result) {
     Digits digits;
-    if (Unpack(value, &digits) == kBadNumber) return kBadNumber;
+    if (Unpack(value, &digits) == errors::kBadNumber) return errors::kBadNumber;
     if (IsInfinite(value)) {
         *result = value.OCINumberPart[1] == 0 ? -std::numeric_limits<Real>::infinity()
                                               : std::numeric_limits<Real>::infinity();
@@ -56,7 +57,7 @@ template <class Real> Errno ToReal(const OCINumber& value, Real* result) {
     *at++ = 'e';
     at = std::to_chars(at, text + sizeof text - 1, decimal.point - decimal.count).ptr;
     *at = '\0';
-    if (Read(text, at, result)) return decimal.point > 0 ? kOverflow : kUnderflow;
+    if (Read(text, at, result)) return decimal.point > 0 ? errors::kNumberOverflow : errors::kNumberUnderflow;
     return 0;
 }
 

@@ -1,6 +1,7 @@
 // Square root and remainder, on whole binary numbers: exact, by the functions of GMP that work on the caller's arrays.
 #include <gmp.h>
 
+#include "handles/errors.h"
 #include "number/digits.h"
 #include "number/limbs.h"
 #include "number/number.h"
@@ -86,7 +87,7 @@ Errno Sqrt(const OCINumber& value, OCINumber* result) noexcept {
     Digits digits;
     if (const Errno error = Unpack(value, &digits)) return error;
     if (digits.IsZero()) return Pack(digits, result);
-    if (digits.negative) return kBadNumber;
+    if (digits.negative) return errors::kBadNumber;
     // Scaled so that the weight of the last digit is even and the root has the 21 digits that rounding needs.
     const int weight = digits.exponent - (kMantissaDigits - 1);
     const int scale = kMantissaDigits + 2 + (weight % 2 != 0);
@@ -100,7 +101,7 @@ Errno Mod(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
     Digits a, b;
     if (const Errno error = Unpack(left, &a)) return error;
     if (const Errno error = Unpack(right, &b)) return error;
-    if (b.IsZero()) return kDividedByZero;
+    if (b.IsZero()) return errors::kDividedByZero;
     if (CompareMagnitude(a, b) < 0) return Pack(a, result);
     const int weight = std::min(a.exponent, b.exponent) - (kMantissaDigits - 1);
     Whole dividend(a), divisor(b);

@@ -1,4 +1,5 @@
 // Rounding and cutting at a decimal place, moving the point, and counting up and down.
+#include "handles/errors.h"
 #include "number/digits.h"
 #include "number/number.h"
 
@@ -105,7 +106,7 @@ Errno Floor(const OCINumber& value, OCINumber* result) noexcept { return ToPlace
 Errno Prec(const OCINumber& value, int digits, OCINumber* result) noexcept {
     Digits parts;
     if (const Errno error = Unpack(value, &parts)) return error;
-    if (digits < 1) return kBadArgument;
+    if (digits < 1) return errors::kNullArgument;
     const int leading_zero = DigitAt(parts, 0) < 10;
     KeepDecimals(&parts, Clamp(digits) + leading_zero, Toward::nearest);
     return Pack(parts, result);

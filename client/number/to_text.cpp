@@ -1,5 +1,6 @@
 // Numbers to text by a model. A text is put together twice: once to know its length, then behind the blanks that fill
 // it up to the width of the model.
+#include "handles/errors.h"
 #include "number/decimal.h"
 #include "number/format.h"
 #include "number/format_model.h"
@@ -193,7 +194,7 @@ Errno PutFixedModel(const OCINumber& value, const FormatModel& model, const Nls&
         if (const Errno error = Round(scaled, model.places_after - scale, &rounded)) return error;
     }
     job.decimal = DecimalOf(rounded);
-    if (!model.scientific && WholePlaces(job.decimal) > places) return kRoundingOverflow;
+    if (!model.scientific && WholePlaces(job.decimal) > places) return errors::kRoundingOverflow;
     PutFilled(model.fill, Width(job), out, [&](Writer* writer) { PutNumber(job, writer); });
     return 0;
 }
@@ -221,7 +222,7 @@ Errno PutHexadecimal(const OCINumber& value, const FormatModel& model, Writer* o
     OCINumber rounded;
     if (const Errno error = Round(value, 0, &rounded)) return error;
     const Decimal decimal = DecimalOf(rounded);
-    if (decimal.negative) return kBadNumber;
+    if (decimal.negative) return errors::kBadNumber;
     char digits[128];
     const int count = HexadecimalDigits(decimal, digits);
     const int shown = std::max({count, model.zeros_before, 1});
@@ -287,7 +288,7 @@ Errno PutPlain(const OCINumber& value, const Nls& nls, Writer* out) {
 Errno ToText(const OCINumber& value, std::string_view model, const Nls& nls, char* text, std::size_t capacity,
              std::size_t* length) noexcept {
     FormatModel parsed;
-    if (!IsValid(value)) return kBadNumber;
+    if (!IsValid(value)) return errors::kBadNumber;
     const bool plain = model.empty() || IsInfinite(value);
     if (!model.empty()) {
         if (const Errno error = ParseFormat(model, &parsed)) return error;
@@ -295,7 +296,7 @@ Errno ToText(const OCINumber& value, std::string_view model, const Nls& nls, cha
     Writer out(text, capacity);
     if (const Errno error = plain ? PutPlain(value, nls, &out) : PutByModel(value, parsed, nls, &out)) return error;
     *length = out.Length();
-    return out.Overflowed() ? kBufferTooSmall : 0;
+    return out.Overflowed() ? errors::kBufferTooSmall : 0;
 }
 
 }  // namespace number

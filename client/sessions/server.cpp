@@ -5,13 +5,11 @@
 #include <utility>
 
 #include "handles/attributes.h"
+#include "handles/errors.h"
 #include "oci.h"
 #include "sessions/session.h"
 
 namespace {
-
-constexpr int kAlreadyAttached = 24309;
-constexpr int kNotConnected = 3114;
 
 Status GetNonBlocking(Server& server, AttributeValue& value) {
     value.integer = server.non_blocking ? 1 : 0;
@@ -86,12 +84,12 @@ std::vector<std::shared_ptr<Link>> Server::Links() const {
 }
 
 Status Server::Attach(std::string_view database) {
-    if (Attached()) return Error(kAlreadyAttached);
+    if (Attached()) return Error(errors::kAlreadyAttached);
     std::unique_ptr<engine::Connection> connection;
     Status status = engine::Connect(database, connection);
     if (status.Failed()) return status;
     const std::lock_guard lock(mutex_);
-    if (attached_) return Error(kAlreadyAttached);
+    if (attached_) return Error(errors::kAlreadyAttached);
     database_ = database;
     version_ = connection->ServerVersion();
     spare_ = std::move(connection);
@@ -100,7 +98,7 @@ Status Server::Attach(std::string_view database) {
 }
 
 Status Server::Detach() {
-    if (!Attached()) return Error(kNotConnected);
+    if (!Attached()) return Error(errors::kNotConnected);
     DropSessions();
     std::unique_ptr<engine::Connection> spare;    // closed when the lock is given up
     const std::lock_guard lock(mutex_);
@@ -132,7 +130,7 @@ Status Server::TakeConnection(std::unique_ptr<engine::Connection>& connection) {
     std::string database;
     {
         const std::lock_guard lock(mutex_);
-        if (!attached_) return Error(kNotConnected);
+        if (!attached_) return Error(errors::kNotConnected);
         connection = std::move(spare_);
         database = database_;
     }

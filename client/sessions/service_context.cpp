@@ -2,14 +2,10 @@
 #include "sessions/service_context.h"
 
 #include "handles/attributes.h"
+#include "handles/errors.h"
 #include "oci.h"
 
 namespace {
-
-constexpr int kNotConnected = 3114;
-constexpr int kNotLoggedOn = 1012;
-constexpr int kReadOnly = 24325;
-constexpr int kBadValue = 24328;
 
 Status GetServerHandle(ServiceContext& service, AttributeValue& value) {
     value.pointer = service.GetServer();
@@ -30,7 +26,7 @@ Status GetTransactionHandle(ServiceContext& service, AttributeValue& value) {
 template <class T, Status (ServiceContext::*setter)(T*)>
 Status SetHandle(Object& object, const AttributeValue& value) {
     T* handle = Live<T>(value.pointer);
-    if (value.pointer && !handle) return Error(kBadValue);
+    if (value.pointer && !handle) return Error(errors::kBadValue);
     return (static_cast<ServiceContext&>(object).*setter)(handle);
 }
 
@@ -59,7 +55,7 @@ std::shared_ptr<std::recursive_mutex> ServiceContext::Serial() {
 
 Status ServiceContext::RequireServer(Server*& server) {
     server = GetServer();
-    return server && server->Attached() ? Status() : Error(kNotConnected);
+    return server && server->Attached() ? Status() : Error(errors::kNotConnected);
 }
 
 Status ServiceContext::Require(std::shared_ptr<Link>& link) {
@@ -68,17 +64,17 @@ Status ServiceContext::Require(std::shared_ptr<Link>& link) {
     if (link) return {};
     Server* server = nullptr;
     Status status = RequireServer(server);
-    return status.Failed() ? status : Error(kNotLoggedOn);
+    return status.Failed() ? status : Error(errors::kNotLoggedOn);
 }
 
 Status ServiceContext::SetServer(Server* server) {
-    if (logged_on_) return Error(kReadOnly);
+    if (logged_on_) return Error(errors::kReadOnly);
     server_ = server;
     return {};
 }
 
 Status ServiceContext::SetSession(Session* session) {
-    if (logged_on_) return Error(kReadOnly);
+    if (logged_on_) return Error(errors::kReadOnly);
     session_ = session;
     return {};
 }

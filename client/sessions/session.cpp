@@ -4,13 +4,11 @@
 #include <utility>
 
 #include "handles/attributes.h"
+#include "handles/errors.h"
 #include "oci.h"
 #include "sessions/server.h"
 
 namespace {
-
-constexpr int kAlreadyAuthenticated = 24313;
-constexpr int kNotLoggedOn = 1012;
 
 Status GetOpenStatements(Session& session, AttributeValue& value) {
     value.integer = session.Begun() ? session.GetLink()->open_statements : 0;
@@ -48,7 +46,7 @@ std::span<const AttributeRow> Session::Attributes() const { return kRows; }
 std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_.Serial(); }
 
 Status Session::Begin(Server& server, const engine::Credentials& credentials) {
-    if (Begun()) return Error(kAlreadyAuthenticated);
+    if (Begun()) return Error(errors::kAlreadyAuthenticated);
     std::unique_ptr<engine::Connection> connection;
     Status status = server.TakeConnection(connection);
     if (status.Failed()) return status;
@@ -72,7 +70,7 @@ Status Session::Adopt(Server& server, std::unique_ptr<engine::Connection> connec
 
 Status Session::End() {
     const SerialLock serial(link_.Serial());    // the caller may hold that of another session
-    if (!Begun()) return Error(kNotLoggedOn);
+    if (!Begun()) return Error(errors::kNotLoggedOn);
     Status status = GetLink()->Engine().Commit();
     if (!status.Failed()) Drop();
     return status;

@@ -2,6 +2,7 @@
 #include "sessions/transaction_handle.h"
 
 #include "handles/attributes.h"
+#include "handles/errors.h"
 #include "oci.h"
 
 namespace {
@@ -9,7 +10,7 @@ namespace {
 constexpr std::size_t kLongestName = 64;
 
 Status SetName(TransactionHandle& handle, const AttributeValue& value) {
-    if (value.text.empty() || value.text.size() > kLongestName) return Error(24328);
+    if (value.text.empty() || value.text.size() > kLongestName) return Error(errors::kBadValue);
     handle.name = value.text;
     return {};
 }

@@ -3,15 +3,12 @@
 #include <algorithm>
 #include <unordered_map>
 
+#include "handles/errors.h"
 #include "sql/token_list.h"
 
 namespace sql {
 namespace {
 
-constexpr int kNotEnded = 933;
-constexpr int kBlockError = 6550;
-constexpr int kUnclosedText = 1756;
-constexpr int kInvalidCharacter = 911;
 constexpr std::uint16_t kBlockCode = 34;
 
 // What the first word of a statement tells.
@@ -105,8 +102,8 @@ private:
 
     void CheckQuotes() {
         for (const Token& token : tokens_) {
-            if (token.kind == TokenKind::unclosed) Fail(kUnclosedText, token);
-            if (token.kind == TokenKind::invalid) Fail(kInvalidCharacter, token);
+            if (token.kind == TokenKind::unclosed) Fail(errors::kUnclosedText, token);
+            if (token.kind == TokenKind::invalid) Fail(errors::kInvalidCharacter, token);
         }
     }
 
@@ -183,7 +180,7 @@ private:
         while (last > 0 && tokens_[last - 1].Is(";")) --last;
         if (!DefinesCode(tokens_)) {
             for (std::size_t index = 0; index < last; ++index)
-                if (tokens_[index].Is(";")) return Fail(kNotEnded, tokens_[index + 1]);
+                if (tokens_[index].Is(";")) return Fail(errors::kNotProperlyEnded, tokens_[index + 1]);
         }
         AddStep(run_, 0, last);
     }
@@ -239,19 +236,19 @@ private:
 
     void ParseBlock() {
         result_.is_block = true;
-        if (result_.type == StatementType::declare) return Fail(kBlockError, tokens_[0]);
+        if (result_.type == StatementType::declare) return Fail(errors::kBlockError, tokens_[0]);
         std::size_t index = 1;
         while (!At(tokens_, index).Is("end")) {
             const std::size_t last = StatementEnd(index);
-            if (!At(tokens_, last).Is(";")) return Fail(kBlockError, At(tokens_, last));
-            if (!BlockStatement(index, last)) return Fail(kBlockError, tokens_[index]);
+            if (!At(tokens_, last).Is(";")) return Fail(errors::kBlockError, At(tokens_, last));
+            if (!BlockStatement(index, last)) return Fail(errors::kBlockError, tokens_[index]);
             index = last + 1;
         }
         ++index;
         if (At(tokens_, index).kind == TokenKind::word) ++index;    // the block's name
         while (At(tokens_, index).Is(";")) ++index;
-        if (At(tokens_, index).kind != TokenKind::end) Fail(kBlockError, tokens_[index]);
-        if (result_.steps.empty()) Fail(kBlockError, tokens_[0]);
+        if (At(tokens_, index).kind != TokenKind::end) Fail(errors::kBlockError, tokens_[index]);
+        if (result_.steps.empty()) Fail(errors::kBlockError, tokens_[0]);
     }
 
     // The index of the semicolon, or of the end of the text.

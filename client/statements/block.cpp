@@ -5,25 +5,14 @@
 #include <cstring>
 
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "statements/result_set.h"
 #include "statements/rows.h"
 #include "statements/statement.h"
 
-namespace {
-
-constexpr int kNoIterations = 24333;
-constexpr int kNotAllBound = 1008;
-constexpr int kBlockError = 6550;
-constexpr int kTooManyRows = 1422;
-constexpr int kNoRows = 1403;
-constexpr int kBadTableLength = 1414;
-constexpr int kBadResultSet = 24336;
-
-}  // namespace
-
 // A block that fails undoes what it did, unless it has ended a transaction on its way.
 Status Statement::RunBlock(const ExecuteArguments& arguments) {
-    if (arguments.iterations <= arguments.first) return Error(kNoIterations);
+    if (arguments.iterations <= arguments.first) return Error(errors::kNoIterations);
     const auto has = [this](auto... runs) {
         return std::any_of(scanned_.steps.begin(), scanned_.steps.end(),
                            [=](const sql::Step& step) { return ((step.run == runs) || ...); });
@@ -70,7 +59,7 @@ Status Statement::RunStep(std::size_t index, ub4 row) {
         default: break;
     }
     for (const std::uint32_t target : step.targets)
-        if (!bound_[target]) return Error(kNotAllBound);
+        if (!bound_[target]) return Error(errors::kNotAllBound);
     Compiled* compiled = nullptr;
     Rows rows;
     if (Status status = Compile(index, compiled); !status.Ok()) return status;
@@ -82,7 +71,8 @@ Status Statement::RunStep(std::size_t index, ub4 row) {
     std::uint32_t elements = 0;
     if (Status status = rows.TableElements(elements); !status.Ok()) return status;
     for (const std::uint32_t target : step.targets)
-        if (bound_[target]->IsTable() && bound_[target]->most_elements < elements) return Error(kBadTableLength);
+        if (bound_[target]->IsTable() && bound_[target]->most_elements < elements)
+            return Error(errors::kBadTableLength);
     for (std::uint32_t element = 0; element < elements; ++element) {
         rows.table_element = element;
         if (Status status = RunElement(*compiled, rows, step, row, element); !status.Ok()) return status;
@@ -119,12 +109,12 @@ Status Statement::SelectInto(Compiled& compiled, Rows& rows, const sql::Step& st
     std::vector<engine::Datum> values(query.Columns().size());
     bool found = false;
     Status status = query.Fetch(values, found);
-    if (status.Ok() && !found) status = Error(kNoRows);
+    if (status.Ok() && !found) status = Error(errors::kNoRows);
     if (status.Ok()) status = StoreTargets(step, query, values, element);
     if (status.Ok()) status = query.Fetch(values, found);
     query.Close();
     if (!status.Ok()) return status;
-    return found ? Error(kTooManyRows) : Status();
+    return found ? Error(errors::kTooManyRows) : Status();
 }
 
 // All rows, one an element; 1414 when there are more than the tables can take.
@@ -142,7 +132,7 @@ Status Statement::SelectIntoTables(Compiled& compiled, Rows& rows, const sql::St
     for (bool found = true; status.Ok();) {
         status = query.Fetch(values, found);
         if (!status.Ok() || !found) break;
-        status = count < most ? StoreTargets(step, query, values, count++) : Error(kBadTableLength);
+        status = count < most ? StoreTargets(step, query, values, count++) : Error(errors::kBadTableLength);
     }
     query.Close();
     for (const std::uint32_t target : step.targets)
@@ -153,9 +143,9 @@ Status Statement::SelectIntoTables(Compiled& compiled, Rows& rows, const sql::St
 // The element points to a statement handle or a result-set descriptor, or is null and gets a new statement.
 Status Statement::OpenCursor(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row) {
     Bind& bind = *bound_[step.targets[0]];
-    if (bind.Type()->family != values::Family::cursor) return Error(kBlockError);
+    if (bind.Type()->family != values::Family::cursor) return Error(errors::kBlockError);
     char* place = bind.elements.Value(row);
-    if (!place) return Error(kBadResultSet);
+    if (!place) return Error(errors::kBadResultSet);
     if (Status status = compiled.query->Open(rows, row); !status.Ok()) return status;
     std::unique_ptr<engine::Query> query = std::move(compiled.query);
 
@@ -163,8 +153,8 @@ Status Statement::OpenCursor(Compiled& compiled, Rows& rows, const sql::Step& st
     std::memcpy(&pointer, place, sizeof pointer);
     Statement* target = Live<Statement>(pointer);
     if (!target) target = Live<ResultSet>(pointer);
-    if (!target && pointer) return Error(kBadResultSet);
-    if (target == this) return Error(kBadResultSet);
+    if (!target && pointer) return Error(errors::kBadResultSet);
+    if (target == this) return Error(errors::kBadResultSet);
     if (!target) target = Create<Statement>(Env(), OCI_HTYPE_STMT, 0);
     target->TakeResult(std::move(query), UsedLink());
     pointer = target;

@@ -3,13 +3,13 @@
 
 #include "handles/attributes.h"
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "statements/bind.h"
 #include "statements/define.h"
 #include "statements/statement.h"
 
 namespace {
 
-constexpr int kIllegalForPieces = 24304;
 constexpr std::uint16_t kUtf16CharacterSet = OCI_UTF16ID;
 
 Status SetCharacterSet(DataArea& area, const AttributeValue& value) {
@@ -63,8 +63,8 @@ DataArea::DataArea(const Origin& origin) : Object(origin) {
 
 Status DataArea::Assign(const AreaArguments& arguments, bool in_pieces) {
     const values::ExternalType* type = values::FindType(arguments.type);
-    if (!type) return Error(values::kUnknownType);
-    if (in_pieces && !type->in_pieces) return Error(kIllegalForPieces);
+    if (!type) return Error(errors::kUnknownType);
+    if (in_pieces && !type->in_pieces) return Error(errors::kIllegalForPieces);
     std::uint32_t size = 0;
     if (const int error = values::CheckSize(*type, arguments.size, size)) return Error(error);
     type_ = type;

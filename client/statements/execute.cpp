@@ -2,40 +2,30 @@
 #include <algorithm>
 #include <utility>
 
+#include "handles/errors.h"
 #include "sessions/service_context.h"
 #include "statements/rows.h"
 #include "statements/statement.h"
 
 namespace {
 
-constexpr int kNotPrepared = 24337;
-constexpr int kBadMode = 24300;
-constexpr int kModesExclude = 24380;
-constexpr int kAlreadyExecuted = 24382;
-constexpr int kNoIterations = 24333;
-constexpr int kOnceOnly = 24969;
-constexpr int kBindsInDefinition = 1027;
-constexpr int kTablesInBlocksOnly = 1484;
-constexpr int kRowsFailed = 24381;
-constexpr int kTooManyRows = 1422;
-
 constexpr ub4 kExecuteModes = OCI_BATCH_MODE | OCI_EXACT_FETCH | OCI_STMT_SCROLLABLE_READONLY | OCI_DESCRIBE_ONLY |
                               OCI_COMMIT_ON_SUCCESS | OCI_NON_BLOCKING | OCI_BATCH_ERRORS | OCI_PARSE_ONLY |
                               OCI_SHOW_DML_WARNINGS;
 
 Status CheckMode(ub4 mode) {
-    if (mode & ~kExecuteModes) return Error(kBadMode);
+    if (mode & ~kExecuteModes) return Error(errors::kBadMode);
     constexpr ub4 kNoRun = OCI_DESCRIBE_ONLY | OCI_PARSE_ONLY;
-    return (mode & kNoRun) == kNoRun ? Error(kModesExclude) : Status();
+    return (mode & kNoRun) == kNoRun ? Error(errors::kModesExclude) : Status();
 }
 
 Status CheckRange(const ExecuteArguments& arguments) {
-    return arguments.iterations <= arguments.first ? Error(kNoIterations) : Status();
+    return arguments.iterations <= arguments.first ? Error(errors::kNoIterations) : Status();
 }
 
 // Statements that take no rows run once.
 Status CheckOnce(const ExecuteArguments& arguments) {
-    if (arguments.iterations > 1) return Error(kOnceOnly);
+    if (arguments.iterations > 1) return Error(errors::kOnceOnly);
     return CheckRange(arguments);
 }
 
@@ -66,7 +56,7 @@ Status Statement::Execute(ServiceContext& service, ErrorHandle& error, const Exe
 // Checks the arguments, joins the link and answers what the text itself tells to be wrong.
 Status Statement::Ready(ServiceContext& service, const ExecuteArguments& arguments) {
     pieces_ = {};
-    if (!prepared_) return Error(kNotPrepared);
+    if (!prepared_) return Error(errors::kNotPrepared);
     if (Status status = CheckMode(arguments.mode); !status.Ok()) return status;
     std::shared_ptr<Link> link;
     if (Status status = service.Require(link); !status.Ok()) return status;
@@ -94,7 +84,7 @@ Status Statement::Compile(std::size_t index, Compiled*& compiled) {
 }
 
 Status Statement::ParseOnly() {
-    if (state_ != State::initialized || described_) return Error(kAlreadyExecuted);
+    if (state_ != State::initialized || described_) return Error(errors::kAlreadyExecuted);
     for (std::size_t index = 0; index < scanned_.steps.size(); ++index) {
         const sql::Run run = scanned_.steps[index].run;
         const bool for_engine = run != sql::Run::commit && run != sql::Run::rollback && run != sql::Run::begin &&
@@ -146,7 +136,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
     Rows rows;
     if (Status status = Compile(0, compiled); !status.Ok()) return status;
     if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
-    if (rows.HasTables()) return Error(kTablesInBlocksOnly);
+    if (rows.HasTables()) return Error(errors::kTablesInBlocksOnly);
     const bool was_described = std::exchange(described_, true);
     if (arguments.iterations > 0) {
         if (Status status = CheckRange(arguments); !status.Ok()) return status;
@@ -179,7 +169,7 @@ Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     }
     CloseCursor();
     state_ = State::end_of_fetch;
-    return more ? Error(kTooManyRows) : status;
+    return more ? Error(errors::kTooManyRows) : status;
 }
 
 // ---- Changes
@@ -198,7 +188,7 @@ Status Statement::RunRows(const ExecuteArguments& arguments, engine::ArrayOutcom
     Rows rows;
     if (Status status = Compile(0, compiled); !status.Ok()) return status;
     if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
-    if (rows.HasTables()) return Error(kTablesInBlocksOnly);
+    if (rows.HasTables()) return Error(errors::kTablesInBlocksOnly);
     if (Status status = Engine().Begin(); !status.Ok()) return status;
     const bool all_rows = arguments.mode & OCI_BATCH_ERRORS;
     if (compiled->query->Columns().empty())
@@ -240,11 +230,11 @@ Status Statement::StoreTargets(const sql::Step& step, engine::Query& query, std:
     const std::size_t count = std::min(step.targets.size(), row.size());
     for (std::size_t target = 0; target < count; ++target) {
         Bind* bind = bound_[step.targets[target]];
-        if (!bind) return Error(1008);
+        if (!bind) return Error(errors::kNotAllBound);
         bind->workspace.column = values::ClassOf(query.Columns()[target].type);
         const auto converters = values::ForColumn(*bind->Type()->out, bind->workspace.column);
         const int error = values::Store(bind->elements, index, converters, bind->workspace, row[target]);
-        if (error != 0 && error != values::kTruncationWarning) return Error(error);
+        if (error != 0 && error != errors::kTruncationWarning) return Error(error);
     }
     return {};
 }
@@ -259,7 +249,7 @@ Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments, 
         return std::move(outcome.failures.front().status);
     }
     for (auto& failure : outcome.failures) error.row_failures.push_back({failure.row, std::move(failure.status)});
-    return Warning(kRowsFailed);
+    return Warning(errors::kRowsFailed);
 }
 
 // ---- Everything else
@@ -268,7 +258,7 @@ Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments, 
 Status Statement::RunOnce(const ExecuteArguments& arguments) {
     const sql::Run run = scanned_.steps[0].run;
     const bool is_definition = run == sql::Run::definition;
-    if (is_definition && !scanned_.placeholders.empty()) return Error(kBindsInDefinition);
+    if (is_definition && !scanned_.placeholders.empty()) return Error(errors::kBindsInDefinition);
     Compiled* compiled = nullptr;
     Rows rows;
     if (Status status = Compile(0, compiled); !status.Ok()) return status;

@@ -1,19 +1,7 @@
 // Statements: fetching rows into the defines.
+#include "handles/errors.h"
 #include "sessions/link.h"
 #include "statements/statement.h"
-
-namespace {
-
-constexpr int kOutOfSequence = 1002;
-constexpr int kNoSuchColumn = 1007;
-constexpr int kConnectionLost = 3114;
-constexpr int kOperationActive = 3127;
-constexpr int kNotExecuted = 24338;
-constexpr int kNoDefines = 24374;
-constexpr int kBadScroll = 24389;
-constexpr int kBadFetch = 24391;
-
-}  // namespace
 
 const std::vector<engine::Column>* Statement::Columns() {
     if (cursor_.IsOpen()) return &cursor_.Columns();
@@ -22,12 +10,12 @@ const std::vector<engine::Column>* Statement::Columns() {
 }
 
 Status Statement::CheckFetch() const {
-    if (pieces_.kind == Pieces::Kind::execute) return Error(kOperationActive);
-    if (link_lost_) return Error(kConnectionLost);
-    if (cancelled_) return Error(kOutOfSequence);
-    if (failed_) return Error(kNoDefines);
-    if (state_ == State::initialized) return Error(kNotExecuted);
-    return cursor_.IsOpen() ? Status() : Error(kOutOfSequence);
+    if (pieces_.kind == Pieces::Kind::execute) return Error(errors::kOperationActive);
+    if (link_lost_) return Error(errors::kNotConnected);
+    if (cancelled_) return Error(errors::kFetchOutOfSequence);
+    if (failed_) return Error(errors::kNoDefines);
+    if (state_ == State::initialized) return Error(errors::kNotExecuted);
+    return cursor_.IsOpen() ? Status() : Error(errors::kFetchOutOfSequence);
 }
 
 Status Statement::Fetch(ub4 rows, ub2 orientation, sb4 offset) {
@@ -45,7 +33,7 @@ Status Statement::Fetch(ub4 rows, ub2 orientation, sb4 offset) {
         if (Status status = GoToFirst(orientation, offset, at_first); !status.Ok()) return status;
         if (!at_first) return EndOfFetch();
     } else if (orientation != OCI_DEFAULT && orientation != OCI_FETCH_NEXT) {
-        return Error(kBadFetch);
+        return Error(errors::kBadFetch);
     }
     return fetches_in_pieces_ ? StartFetchInPieces(rows, at_first, false) : FetchRows(rows, 0, at_first);
 }
@@ -62,7 +50,7 @@ Status Statement::GoToFirst(ub2 orientation, sb4 offset, bool& found) {
         case OCI_FETCH_FIRST: target = 1; break;
         case OCI_FETCH_RELATIVE: target = position + offset; break;
         case OCI_FETCH_ABSOLUTE:
-            if (offset < 0) return Error(kBadScroll);
+            if (offset < 0) return Error(errors::kBadScroll);
             target = offset;
             break;
         case OCI_FETCH_LAST: {
@@ -71,7 +59,7 @@ Status Statement::GoToFirst(ub2 orientation, sb4 offset, bool& found) {
             target = static_cast<std::int64_t>(count);
             break;
         }
-        default: return Error(kBadFetch);
+        default: return Error(errors::kBadFetch);
     }
     return cursor_.GoTo(target > 0 ? static_cast<std::uint64_t>(target) : 0, found);
 }
@@ -85,7 +73,7 @@ Status Statement::ActivateDefines() {
     for (std::uint32_t index = 0; index < defined_.size(); ++index) {
         Define* define = defined_[index];
         if (!define) continue;
-        if (index >= columns.size()) return Error(kNoSuchColumn);
+        if (index >= columns.size()) return Error(errors::kNoSuchColumn);
         define->workspace.column = values::ClassOf(columns[index].type);
         const values::ExternalType& type = *define->Type();
         ActiveDefine& active = active_.emplace_back(ActiveDefine{define, index, {}, {}});
@@ -93,7 +81,7 @@ Status Statement::ActivateDefines() {
         if (define->InPieces()) active.renderers = values::ForColumn(*type.pieces, define->workspace.column);
         fetches_in_pieces_ |= define->InPieces();
     }
-    if (active_.empty()) return Error(kNoDefines);
+    if (active_.empty()) return Error(errors::kNoDefines);
     defines_changed_ = false;
     return {};
 }
@@ -108,7 +96,7 @@ Status Statement::FetchRows(ub4 rows, ub4 first, bool at_first) {
             if (!found) return EndOfFetch();
         }
         if (const int error = StoreRow(first + row)) {
-            if (error != values::kTruncationWarning) return Error(error);
+            if (error != errors::kTruncationWarning) return Error(error);
             outcome = Warning(error);
         }
         ++rows_fetched_;
@@ -125,7 +113,7 @@ int Statement::StoreRow(ub4 index) {
         if (active.define->InPieces()) continue;
         const int error = values::Store(active.define->elements, index, active.converters, active.define->workspace,
                                         row[active.column]);
-        if (error != 0 && (worst == 0 || worst == values::kTruncationWarning)) worst = error;
+        if (error != 0 && (worst == 0 || worst == errors::kTruncationWarning)) worst = error;
     }
     return worst;
 }

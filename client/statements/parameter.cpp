@@ -4,11 +4,11 @@
 #include <algorithm>
 
 #include "handles/attributes.h"
+#include "handles/errors.h"
 #include "handles/gate.h"
 
 namespace {
 
-constexpr int kNoParameter = 24334;
 constexpr std::uint32_t kDefaultSize = 4000;    // reported where the engine sets no limit
 constexpr std::uint64_t kLongestName = 0xFFFF;
 
@@ -114,8 +114,8 @@ std::shared_ptr<std::recursive_mutex> Parameter::Serial() { return statement ? s
 // One descriptor a position: handed out again and brought up to date, so that asking often leaves nothing behind.
 Status Statement::GetParameter(ub4 position, dvoid** out) {
     const std::vector<engine::Column>* columns = Columns();
-    if (!columns || position == 0 || position > columns->size()) return Error(kNoParameter);
-    if (!out) return Error(kNullArgument);
+    if (!columns || position == 0 || position > columns->size()) return Error(errors::kNoParameter);
+    if (!out) return Error(errors::kNullArgument);
     if (parameters_.size() < position) parameters_.resize(position);
     Parameter*& parameter = parameters_[position - 1];
     if (!parameter) {

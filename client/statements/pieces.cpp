@@ -5,17 +5,11 @@
 #include <cstring>
 #include <utility>
 
+#include "handles/errors.h"
 #include "sessions/link.h"
 #include "statements/statement.h"
 
 namespace {
-
-constexpr int kWantsPiece = 3129;
-constexpr int kWantsBuffer = 3130;
-constexpr int kNoBuffer = 3131;
-constexpr int kBadBuffer = 24306;
-constexpr int kBadLength = 24307;
-constexpr int kIllegalOperation = 24370;
 
 void SetIndicator(const PieceBuffer& piece, std::int16_t indicator) {
     if (piece.indicator) std::memcpy(piece.indicator, &indicator, sizeof indicator);
@@ -45,18 +39,18 @@ std::size_t PieceLength(const Define& define, std::string_view rest, std::size_t
 // A null, into the application's places for it.
 int TakeNull(const PieceBuffer& piece) {
     *piece.length = 0;
-    SetCode(piece, values::kNullFetched);
+    SetCode(piece, errors::kNullFetched);
     SetIndicator(piece, values::kNullIndicator);
-    return piece.indicator ? 0 : values::kNullFetched;
+    return piece.indicator ? 0 : errors::kNullFetched;
 }
 
 // Moves the next part of `rest` into the buffer; terminated types get a zero that is not counted.
 int TakePiece(const Define& define, const PieceBuffer& piece, std::string_view& rest) {
     const std::size_t zero = define.Type()->code != SQLT_STR ? 0 : define.workspace.utf16 ? 2 : 1;
     const std::size_t room = *piece.length;
-    if (room < zero) return kBadLength;
+    if (room < zero) return errors::kBadLength;
     const std::size_t taken = PieceLength(define, rest, room - zero);
-    if (taken == 0 && !rest.empty()) return kBadLength;
+    if (taken == 0 && !rest.empty()) return errors::kBadLength;
     auto* buffer = static_cast<char*>(piece.buffer);
     if (taken > 0) std::memcpy(buffer, rest.data(), taken);
     std::memset(buffer + taken, 0, zero);
@@ -69,7 +63,7 @@ int TakePiece(const Define& define, const PieceBuffer& piece, std::string_view& 
 
 void MarkCut(const PieceBuffer& piece, std::size_t whole) {
     constexpr std::size_t kLongest = 32767;
-    SetCode(piece, values::kTruncated);
+    SetCode(piece, errors::kTruncated);
     SetIndicator(piece, whole <= kLongest ? static_cast<std::int16_t>(whole) : values::kLongIndicator);
 }
 
@@ -78,7 +72,7 @@ void MarkCut(const PieceBuffer& piece, std::size_t whole) {
 // ---- What is wanted
 
 Status Statement::GetPieceInfo(PieceInfo& info) const {
-    if (pieces_.kind == Pieces::Kind::none) return Error(kIllegalOperation);
+    if (pieces_.kind == Pieces::Kind::none) return Error(errors::kIllegalOperation);
     const ub1 piece = pieces_.continued ? OCI_NEXT_PIECE : OCI_ONE_PIECE;
     if (pieces_.kind == Pieces::Kind::execute) {
         info = {pieces_.binds[pieces_.bind], OCI_HTYPE_BIND, OCI_PARAM_IN, pieces_.iteration, 0, piece};
@@ -91,10 +85,10 @@ Status Statement::GetPieceInfo(PieceInfo& info) const {
 Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) {
     PieceInfo wanted;
     if (Status status = GetPieceInfo(wanted); !status.Ok()) return status;
-    if (wanted.handle != &area || piece.piece > OCI_LAST_PIECE) return Error(kIllegalOperation);
+    if (wanted.handle != &area || piece.piece > OCI_LAST_PIECE) return Error(errors::kIllegalOperation);
     const bool null_in = wanted.direction == OCI_PARAM_IN && IsNull(piece);
-    if (!null_in && !piece.length) return Error(kBadLength);
-    if (!null_in && !piece.buffer) return Error(kBadBuffer);
+    if (!null_in && !piece.length) return Error(errors::kBadLength);
+    if (!null_in && !piece.buffer) return Error(errors::kBadBuffer);
     area.piece = piece;
     area.piece.is_set = true;
     return {};
@@ -116,10 +110,10 @@ Status Statement::NextRowInPieces(bool at_row) {
     if (status.Ok() && !found) status = EndOfFetch();
     if (status.Ok()) {
         const int error = StoreRow(pieces_.row);
-        if (error != 0 && error != values::kTruncationWarning) status = Error(error);
+        if (error != 0 && error != errors::kTruncationWarning) status = Error(error);
     }
     int error = 0;
-    if (status.Ok() && NextDefineInPieces(0, error)) return NeedData(kWantsBuffer);
+    if (status.Ok() && NextDefineInPieces(0, error)) return NeedData(errors::kWantsBuffer);
     pieces_.kind = Pieces::Kind::none;
     return error != 0 ? Error(error) : status;
 }
@@ -147,17 +141,17 @@ bool Statement::NextDefineInPieces(std::size_t from, int& error) {
 Status Statement::ContinueFetch() {
     Define& define = *active_[pieces_.active].define;
     const PieceBuffer piece = std::exchange(define.piece, {});
-    if (!piece.is_set) return Error(kNoBuffer);
+    if (!piece.is_set) return Error(errors::kNoBuffer);
     int error = pieces_.is_null ? TakeNull(piece) : TakePiece(define, piece, pieces_.rest);
-    if (error == kBadLength) return Error(error);
+    if (error == errors::kBadLength) return Error(error);
     if (error == 0 && !pieces_.rest.empty()) {
         if (piece.piece != OCI_LAST_PIECE) {
             pieces_.continued = true;
-            return NeedData(kWantsBuffer);
+            return NeedData(errors::kWantsBuffer);
         }
         MarkCut(piece, pieces_.whole.size());
     }
-    if (error == 0 && NextDefineInPieces(pieces_.active + 1, error)) return NeedData(kWantsBuffer);
+    if (error == 0 && NextDefineInPieces(pieces_.active + 1, error)) return NeedData(errors::kWantsBuffer);
     if (error != 0) {
         pieces_.kind = Pieces::Kind::none;
         return Error(error);
@@ -183,20 +177,20 @@ Status Statement::StartExecuteInPieces(const ExecuteArguments& arguments) {
     pieces_.kind = Pieces::Kind::execute;
     pieces_.arguments = arguments;
     pieces_.iteration = arguments.first;
-    return NeedData(kWantsPiece);
+    return NeedData(errors::kWantsPiece);
 }
 
 Status Statement::ContinueExecute(ErrorHandle& error) {
     Bind& bind = *pieces_.binds[pieces_.bind];
     const PieceBuffer piece = std::exchange(bind.piece, {});
-    if (!piece.is_set) return Error(kNoBuffer);
+    if (!piece.is_set) return Error(errors::kNoBuffer);
     const bool is_null = IsNull(piece);
     if (!is_null) bind.collected.append(static_cast<const char*>(piece.buffer), *piece.length);
     bind.collected_null = is_null;
     SetCode(piece, 0);
     pieces_.continued = !is_null && piece.piece != OCI_ONE_PIECE && piece.piece != OCI_LAST_PIECE;
-    if (pieces_.continued) return NeedData(kWantsPiece);
-    if (++pieces_.bind < pieces_.binds.size()) return NeedData(kWantsPiece);
+    if (pieces_.continued) return NeedData(errors::kWantsPiece);
+    if (++pieces_.bind < pieces_.binds.size()) return NeedData(errors::kWantsPiece);
     return RunCollected(error);
 }
 
@@ -214,7 +208,7 @@ Status Statement::RunCollected(ErrorHandle& error) {
     if (!stop && ++pieces_.iteration < arguments.iterations) {
         pieces_.bind = 0;
         for (Bind* bind : pieces_.binds) bind->collected.clear();
-        return NeedData(kWantsPiece);
+        return NeedData(errors::kWantsPiece);
     }
     engine::ArrayOutcome outcome = std::move(pieces_.outcome);
     pieces_ = {};

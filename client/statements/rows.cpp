@@ -2,13 +2,11 @@
 
 #include <algorithm>
 
+#include "handles/errors.h"
 #include "values/in_rows.h"
 #include "values/rowid.h"
 
 namespace {
-
-constexpr int kNotAllBound = 1008;
-constexpr int kTablesDiffer = 6502;
 
 // What the pieces made: text of a terminated type ends at the zero.
 int LoadCollected(Bind& bind, engine::Datum& value) {
@@ -28,7 +26,7 @@ Status Statement::Rows::Collect(const Statement& statement, const Compiled& comp
     slots_.reserve(placeholders.size());
     for (const std::uint32_t placeholder : placeholders) {
         Bind* bind = statement.bound_[placeholder];
-        if (!bind) return Error(kNotAllBound);
+        if (!bind) return Error(errors::kNotAllBound);
         const sql::Placeholder& named = statement.scanned_.placeholders[placeholder];
         const auto first = std::lower_bound(placeholders.begin(), placeholders.end(), named.first);
         auto same_as = static_cast<std::size_t>(first - placeholders.begin());
@@ -66,7 +64,7 @@ Status Statement::Rows::TableElements(std::uint32_t& count) const {
     bool first = true;
     for (const Slot& slot : slots_) {
         if (!slot.bind->IsTable()) continue;
-        if (!first && *slot.bind->current_elements != count) return Error(kTablesDiffer);
+        if (!first && *slot.bind->current_elements != count) return Error(errors::kTablesDiffer);
         count = *slot.bind->current_elements;
         first = false;
     }

@@ -4,17 +4,13 @@
 #include <algorithm>
 #include <utility>
 
+#include "handles/errors.h"
 #include "handles/gate.h"
 #include "statements/parameter.h"
 #include "statements/statement_cache.h"
 
 namespace {
 
-constexpr int kNotPrepared = 24337;
-constexpr int kNoSuchBind = 1036;
-constexpr int kIllegalDefinePosition = 24308;
-constexpr int kBadMode = 24300;
-constexpr int kBadTableLength = 1414;
 constexpr std::uint32_t kMostColumns = 65535;
 
 constexpr ub4 kBindModes = OCI_SB2_IND_PTR | OCI_DATA_AT_EXEC | OCI_PIECEWISE | OCI_BIND_SOFT | OCI_IOV;
@@ -117,10 +113,10 @@ Status Statement::Prepare(std::string_view text) {
 // ---- Binds
 
 Status Statement::MakeBind(OCIBind** handle, const BindArguments& arguments, Bind*& bind) {
-    if (arguments.mode & ~kBindModes) return Error(kBadMode);
+    if (arguments.mode & ~kBindModes) return Error(errors::kBadMode);
     if (arguments.current_elements && arguments.most_elements > 0 &&
         *arguments.current_elements > arguments.most_elements)
-        return Error(kBadTableLength);
+        return Error(errors::kBadTableLength);
     bind = Existing<Bind>(handle);
     const bool is_new = !bind;
     if (is_new) bind = Create<Bind>(*this, OCI_HTYPE_BIND, 0);
@@ -154,12 +150,12 @@ void Statement::SetBoundByName(std::uint32_t first, Bind& bind) {
 }
 
 Status Statement::BindByName(OCIBind** handle, std::string_view written, const BindArguments& arguments) {
-    if (!handle) return Error(kNullArgument);
-    if (!prepared_) return Error(kNotPrepared);
+    if (!handle) return Error(errors::kNullArgument);
+    if (!prepared_) return Error(errors::kNotPrepared);
     const std::string name = sql::PlaceholderName(written);
     const auto& all = scanned_.placeholders;
     const auto found = std::find_if(all.begin(), all.end(), [&](const sql::Placeholder& p) { return p.name == name; });
-    if (found == all.end()) return Error(kNoSuchBind);
+    if (found == all.end()) return Error(errors::kNoSuchBind);
     Bind* bind = nullptr;
     if (Status status = MakeBind(handle, arguments, bind); !status.Ok()) return status;
     SetBoundByName(found->first, *bind);
@@ -167,9 +163,9 @@ Status Statement::BindByName(OCIBind** handle, std::string_view written, const B
 }
 
 Status Statement::BindByPosition(OCIBind** handle, ub4 position, const BindArguments& arguments) {
-    if (!handle) return Error(kNullArgument);
-    if (!prepared_) return Error(kNotPrepared);
-    if (position == 0 || position > scanned_.positions.size()) return Error(kNoSuchBind);
+    if (!handle) return Error(errors::kNullArgument);
+    if (!prepared_) return Error(errors::kNotPrepared);
+    if (position == 0 || position > scanned_.positions.size()) return Error(errors::kNoSuchBind);
     Bind* bind = nullptr;
     if (Status status = MakeBind(handle, arguments, bind); !status.Ok()) return status;
     const std::uint32_t placeholder = scanned_.positions[position - 1];
@@ -190,12 +186,12 @@ void Statement::Forget(const Bind& bind) noexcept {
 // ---- Defines
 
 Status Statement::DefineByPosition(OCIDefine** handle, ub4 position, const AreaArguments& arguments, ub4 mode) {
-    if (!handle) return Error(kNullArgument);
-    if (!prepared_ && !HasResult()) return Error(kNotPrepared);
-    if (position == 0 || position > kMostColumns) return Error(kIllegalDefinePosition);
-    if (mode & ~kDefineModes) return Error(kBadMode);
+    if (!handle) return Error(errors::kNullArgument);
+    if (!prepared_ && !HasResult()) return Error(errors::kNotPrepared);
+    if (position == 0 || position > kMostColumns) return Error(errors::kIllegalDefinePosition);
+    if (mode & ~kDefineModes) return Error(errors::kBadMode);
     const bool in_pieces = mode & OCI_DYNAMIC_FETCH;
-    if (!in_pieces && !arguments.value) return Error(kNullArgument);
+    if (!in_pieces && !arguments.value) return Error(errors::kNullArgument);
     auto* define = Existing<Define>(handle);
     const bool is_new = !define;
     if (is_new) define = Create<Define>(*this, OCI_HTYPE_DEFINE, 0);
@@ -243,10 +239,10 @@ const std::string& Statement::KeptName(std::size_t placeholder, bool indicator) 
 }
 
 Status Statement::GetBindInfo(const BindInfo& info) {
-    if (!prepared_) return Error(kNotPrepared);
+    if (!prepared_) return Error(errors::kNotPrepared);
     const std::size_t total = bound_.size();
     if (info.found) *info.found = 0;
-    if (info.first == 0) return Error(kNoSuchBind);
+    if (info.first == 0) return Error(errors::kNoSuchBind);
     if (info.first > total) return NoData();
     const std::size_t first = info.first - 1;
     const std::size_t count = std::min<std::size_t>(total - first, info.size);

@@ -1,6 +1,7 @@
 // Attributes of statements.
 #include "handles/attributes.h"
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "statements/statement.h"
 #include "values/rowid_descriptor.h"
 
@@ -62,10 +63,9 @@ struct StatementAttributes {
         return {};
     }
     static Status RowId(Statement& statement, AttributeValue& value) {
-        constexpr int kNoRowId = 1410;
         auto* descriptor = Live<RowIdDescriptor>(value.pointer);
         if (!descriptor) return InvalidHandle();
-        if (statement.last_row_ == 0) return Error(kNoRowId);
+        if (statement.last_row_ == 0) return Error(errors::kInvalidRowId);
         descriptor->value = rowid::RowId{0, statement.last_row_};
         return {};
     }

@@ -3,15 +3,11 @@
 #include <algorithm>
 
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "sessions/service_context.h"
 #include "statements/statement.h"
 
 namespace {
-
-constexpr int kNoTextOrKey = 24430;
-constexpr int kNotInCache = 24431;
-constexpr int kUntagged = 24432;
-constexpr int kNotFromPrepare2 = 24434;
 
 // The cache of a session, as large as the service context asks; null when it asks for none.
 StatementCache* CacheOf(ServiceContext& service, Link& link) {
@@ -73,15 +69,15 @@ void StatementCache::Keep(Statement& statement, std::string_view key) {
 void StatementCache::Forget(const Statement& statement) noexcept { std::erase(kept_, &statement); }
 
 Status PrepareThroughCache(ServiceContext& service, const PrepareRequest& request, Statement*& statement) {
-    if (request.text.empty() && request.key.empty()) return Error(kNoTextOrKey);
+    if (request.text.empty() && request.key.empty()) return Error(errors::kNoTextOrKey);
     std::shared_ptr<Link> link;
     if (Status status = service.Require(link); !status.Ok()) return status;
     StatementCache* cache = CacheOf(service, *link);
     statement = cache && !request.key.empty() ? cache->TakeByKey(request.key) : nullptr;
     if (statement) return {};
     if (cache && !request.text.empty()) statement = cache->TakeByText(request.text);
-    if (statement) return request.key.empty() ? Status() : Warning(kUntagged);
-    if (request.search_only || request.text.empty()) return Error(kNotInCache);
+    if (statement) return request.key.empty() ? Status() : Warning(errors::kUntagged);
+    if (request.search_only || request.text.empty()) return Error(errors::kNotInCache);
     Statement* made = Create<Statement>(service.Env(), OCI_HTYPE_STMT, 0);
     try {
         Status status = made->Prepare(request.text);
@@ -96,7 +92,7 @@ Status PrepareThroughCache(ServiceContext& service, const PrepareRequest& reques
 }
 
 Status Release(Statement& statement, std::string_view key, bool keep) {
-    if (!statement.from_prepare2) return Error(kNotFromPrepare2);
+    if (!statement.from_prepare2) return Error(errors::kNotFromPrepare2);
     StatementCache* cache = statement.Cache();
     if (keep && cache) cache->Keep(statement, key);
     else Destroy(&statement);

@@ -5,10 +5,10 @@
 #include <cstring>
 
 #include "handles/environment.h"
+#include "handles/errors.h"
 
 namespace {
 
-constexpr int kSizeTooLarge = 22140;
 constexpr std::uint32_t kLargest = 256U << 20;    // a length beyond that is a mistake, and nothing to be read
 constexpr std::size_t kTerminator = 2;
 
@@ -27,7 +27,7 @@ void Variable::Replace(std::uint32_t room, std::string_view content) {
 }
 
 Status Variable::Assign(std::string_view content) {
-    if (content.size() > kLargest) return Error(kSizeTooLarge);
+    if (content.size() > kLargest) return Error(errors::kSizeTooLarge);
     if (!data_ || content.size() > room_) {
         Replace(static_cast<std::uint32_t>(content.size()), content);
         return {};
@@ -39,7 +39,7 @@ Status Variable::Assign(std::string_view content) {
 }
 
 Status Variable::Resize(std::uint32_t size) {
-    if (size > kLargest) return Error(kSizeTooLarge);
+    if (size > kLargest) return Error(errors::kSizeTooLarge);
     Replace(size, View().substr(0, std::min<std::size_t>(size, size_)));
     return {};
 }

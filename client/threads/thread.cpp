@@ -3,6 +3,8 @@
 // main thread when the process does.
 #include "threads/thread.h"
 
+#include "handles/errors.h"
+
 #include <pthread.h>
 
 #include <algorithm>
@@ -12,10 +14,7 @@
 
 namespace {
 
-constexpr int kMisuse = 21560;
-constexpr int kCannotStart = 21500;
-
-Status Misuse(const char* what) { return Error(kMisuse, what); }
+Status Misuse(const char* what) { return Error(errors::kNullArgument, what); }
 
 std::atomic<std::uint64_t> last_number{0};
 
@@ -206,7 +205,7 @@ Status StartThread(void (*routine)(void* argument), void* argument, ThreadId* id
     if (const int failed = StartDetached(start)) {
         if (id) id->number = old_number;
         if (handle) handle->Set(std::move(old_state));
-        return Error(kCannotStart, std::system_category().message(failed));
+        return Error(errors::kCannotStart, std::system_category().message(failed));
     }
     return {};
 }

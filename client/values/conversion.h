@@ -18,26 +18,6 @@ class Environment;
 
 namespace values {
 
-constexpr int kNullFetched = 1405;
-constexpr int kTruncated = 1406;
-constexpr int kBadRowId = 1410;
-constexpr int kBadPackedDecimal = 1413;
-constexpr int kNumericOverflow = 1426;
-constexpr int kIntegerOverflow = 1455;
-constexpr int kBadVaryingLength = 1458;     // a prefix longer than its area
-constexpr int kBadAreaLength = 1459;        // an area too small for what it must hold, or of negative length
-constexpr int kBadHex = 1465;
-constexpr int kNoTerminator = 1480;
-constexpr int kBadFixedLength = 1483;       // a number or date whose area has the wrong size
-constexpr int kLengthPastArea = 1485;
-constexpr int kInvalidNumber = 1722;
-constexpr int kUnsetDatetime = 1866;        // a datetime descriptor without a value
-constexpr int kBadObject = 21710;           // an element that should point to an object of its type, and does not
-constexpr int kInconsistentTypes = 932;
-constexpr int kUnknownType = 3115;
-constexpr int kTruncationWarning = 24345;
-constexpr int kBadCharacters = 24365;       // text that cannot be converted to or from UTF-16
-
 // What a select-list column holds, as far as its values convert in their own way.
 enum class ColumnClass : std::uint8_t { plain, number, binary_float, date, timestamp, timestamp_zone };
 ColumnClass ClassOf(std::uint16_t internal_type);

@@ -2,6 +2,7 @@
 // code.
 #include <limits>
 
+#include "handles/errors.h"
 #include "oci.h"
 #include "values/in_rows.h"
 #include "values/out_rows.h"
@@ -54,8 +55,8 @@ const ExternalType kTypes[] = {
 int StoreNull(const Elements& elements, std::size_t index) {
     elements.SetIndicator(index, kNullIndicator);
     elements.SetLength(index, 0);
-    elements.SetCode(index, kNullFetched);
-    return elements.indicators ? 0 : kNullFetched;
+    elements.SetCode(index, errors::kNullFetched);
+    return elements.indicators ? 0 : errors::kNullFetched;
 }
 
 // The indicator tells the whole length, if it can.
@@ -63,8 +64,8 @@ int StoreTruncated(const Elements& elements, std::size_t index, const Target& ta
     constexpr std::size_t kLongest = std::numeric_limits<std::int16_t>::max();
     elements.SetIndicator(index, target.whole <= kLongest ? static_cast<std::int16_t>(target.whole) : kLongIndicator);
     elements.SetLength(index, target.stored);
-    elements.SetCode(index, kTruncated);
-    return elements.codes ? kTruncationWarning : kTruncated;
+    elements.SetCode(index, errors::kTruncated);
+    return elements.codes ? errors::kTruncationWarning : errors::kTruncated;
 }
 
 }  // namespace
@@ -98,10 +99,10 @@ const ExternalType* FindType(std::uint16_t code) {
 int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area) {
     if (type.is_pointer && size <= 0) size = kPointer;
     const bool variable = !type.is_pointer && (type.family == Family::text || type.family == Family::bytes);
-    if (size < type.least_size) return variable ? kBadAreaLength : kBadFixedLength;
+    if (size < type.least_size) return variable ? errors::kBadAreaLength : errors::kBadFixedLength;
     const bool power_of_two = (size & (size - 1)) == 0;
-    if (type.family == Family::integer && (size > 8 || !power_of_two)) return kBadFixedLength;
-    if (type.family == Family::real && (size > 16 || !power_of_two)) return kBadFixedLength;
+    if (type.family == Family::integer && (size > 8 || !power_of_two)) return errors::kBadFixedLength;
+    if (type.family == Family::real && (size > 16 || !power_of_two)) return errors::kBadFixedLength;
     area = static_cast<std::uint32_t>(size);
     return 0;
 }
@@ -113,7 +114,7 @@ int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter
     if (!at) return 0;
     Target target{at, elements.size};
     const int error = converters[static_cast<std::size_t>(datum.kind)](datum, workspace, target);
-    if (error == kTruncated) return StoreTruncated(elements, index, target);
+    if (error == errors::kTruncated) return StoreTruncated(elements, index, target);
     elements.SetCode(index, error);
     if (error != 0) return error;
     elements.SetIndicator(index, 0);
@@ -121,7 +122,7 @@ int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter
     return 0;
 }
 
-int NoConversion(const engine::Datum&, Workspace&, Target&) { return kInconsistentTypes; }
+int NoConversion(const engine::Datum&, Workspace&, Target&) { return errors::kInconsistentTypes; }
 
 const ByOrigin<OutConverter> kToNothing = [] {
     ByOrigin<OutConverter> row;

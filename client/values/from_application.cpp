@@ -5,6 +5,7 @@
 
 #include "date/date.h"
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "number/decimal_float.h"
 #include "number/number.h"
 #include "oci.h"
@@ -28,7 +29,7 @@ void SetView(Kind kind, View view, Datum& datum) {
 int SetText(View text, Workspace& workspace, Datum& datum) {
     if (workspace.utf16) {
         workspace.text.clear();
-        if (!utf::ToUtf8(text.data(), text.size(), workspace.text)) return kBadCharacters;
+        if (!utf::ToUtf8(text.data(), text.size(), workspace.text)) return errors::kBadCharacters;
         text = workspace.text;
     }
     SetView(Kind::text, text, datum);
@@ -37,7 +38,7 @@ int SetText(View text, Workspace& workspace, Datum& datum) {
 
 // The bytes of an element whose length stands beside it, or is that of the area.
 int GivenBytes(const Source& source, View& bytes) {
-    if (source.has_length && source.length > source.size) return kLengthPastArea;
+    if (source.has_length && source.length > source.size) return errors::kLengthPastArea;
     bytes = {source.at, source.has_length ? source.length : source.size};
     return 0;
 }
@@ -47,7 +48,7 @@ template <class Prefix>
 int PrefixedBytes(const Source& source, View& bytes) {
     Prefix length;
     std::memcpy(&length, source.at, sizeof length);
-    if (length > source.size - sizeof length) return kBadVaryingLength;
+    if (length > source.size - sizeof length) return errors::kBadVaryingLength;
     bytes = {source.at + sizeof length, length};
     return 0;
 }
@@ -60,7 +61,7 @@ int TerminatedBytes(const Source& source, bool utf16, View& bytes) {
     else while (end + 2 <= bytes.size() && (bytes[end] != 0 || bytes[end + 1] != 0)) end += 2;
     const std::size_t zero = utf16 ? 2 : 1;
     const bool found = end + zero <= bytes.size();
-    if (!found && !source.has_length && !bytes.empty()) return kNoTerminator;
+    if (!found && !source.has_length && !bytes.empty()) return errors::kNoTerminator;
     bytes = bytes.substr(0, end);
     return 0;
 }
@@ -68,7 +69,7 @@ int TerminatedBytes(const Source& source, bool utf16, View& bytes) {
 // Whole numbers of up to 64 bits go as such, the others as decimals in the workspace.
 int SetNumber(const OCINumber& number, Workspace& workspace, Datum& datum) {
     int is_integer = 0;
-    if (number::IsInt(number, &is_integer) != 0) return kInvalidNumber;
+    if (number::IsInt(number, &is_integer) != 0) return errors::kInvalidNumber;
     if (is_integer && number::ToInt64(number, &datum.integer) == 0) {
         datum.kind = Kind::integer;
         return 0;
@@ -202,6 +203,6 @@ int FromOdt(const Source& source, Workspace& workspace, Datum& datum) {
     return SetDate(value, workspace, datum);
 }
 
-int FromNothing(const Source&, Workspace&, Datum&) { return kInconsistentTypes; }
+int FromNothing(const Source&, Workspace&, Datum&) { return errors::kInconsistentTypes; }
 
 }  // namespace values

@@ -2,6 +2,7 @@
 // element of a string or raw gets an object of its own on the way out; descriptors are the application's to make.
 #include "date/descriptor.h"
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "text/variable.h"
 #include "values/in_rows.h"
 #include "values/out_rows.h"
@@ -25,8 +26,8 @@ template <class T>
 int PutVariable(View content, Workspace& workspace, Target& target) {
     void* pointer = PointerAt(target.at);
     T* value = pointer ? Live<T>(pointer) : Create<T>(*workspace.environment, 0, 0);
-    if (!value) return kBadObject;
-    if (!value->Assign(content).Ok()) return kLengthPastArea;
+    if (!value) return errors::kBadObject;
+    if (!value->Assign(content).Ok()) return errors::kLengthPastArea;
     pointer = value;
     std::memcpy(target.at, &pointer, sizeof pointer);
     target.stored = sizeof pointer;
@@ -39,7 +40,7 @@ int FromVariable(const Source& source, Workspace& workspace, Datum& datum,
     const void* pointer = PointerAt(source.at);
     if (!pointer) return 0;
     const T* value = Live<T>(pointer);
-    return value ? convert(value->View(), workspace, datum) : kBadObject;
+    return value ? convert(value->View(), workspace, datum) : errors::kBadObject;
 }
 
 int RowIdOfDatum(const Datum& datum, Workspace&, rowid::RowId& value) {
@@ -47,16 +48,16 @@ int RowIdOfDatum(const Datum& datum, Workspace&, rowid::RowId& value) {
     return 0;
 }
 int RowIdOfText(const Datum& datum, Workspace&, rowid::RowId& value) {
-    return rowid::FromText(datum.Text(), &value) ? 0 : kBadRowId;
+    return rowid::FromText(datum.Text(), &value) ? 0 : errors::kInvalidRowId;
 }
 int PutRid(const rowid::RowId& value, Workspace&, Target& target) {
     target.stored = rowid::kByteLength;
-    return rowid::ToBytes(value, reinterpret_cast<std::uint8_t*>(target.at)) ? 0 : kBadRowId;
+    return rowid::ToBytes(value, reinterpret_cast<std::uint8_t*>(target.at)) ? 0 : errors::kInvalidRowId;
 }
 
 int PutRdd(const rowid::RowId& value, Workspace&, Target& target) {
     auto* descriptor = Live<RowIdDescriptor>(PointerAt(target.at));
-    if (!descriptor) return kBadObject;
+    if (!descriptor) return errors::kBadObject;
     descriptor->value = value;
     target.stored = sizeof(void*);
     return 0;
@@ -94,7 +95,7 @@ int FromRaw(const Source& source, Workspace& workspace, Datum& datum) {
 
 int PutDatetime(const date::DateTime& value, Workspace&, Target& target) {
     auto* descriptor = Live<DateTimeDescriptor>(PointerAt(target.at));
-    if (!descriptor) return kBadObject;
+    if (!descriptor) return errors::kBadObject;
     target.stored = sizeof(void*);
     return descriptor->Store(value).Number();
 }
@@ -102,8 +103,8 @@ int PutDatetime(const date::DateTime& value, Workspace&, Target& target) {
 // A descriptor without a date gives the time alone.
 int FromDatetime(const Source& source, Workspace& workspace, Datum& datum) {
     const auto* descriptor = Live<DateTimeDescriptor>(PointerAt(source.at));
-    if (!descriptor) return kBadObject;
-    if (!descriptor->IsSet()) return kUnsetDatetime;
+    if (!descriptor) return errors::kBadObject;
+    if (!descriptor->IsSet()) return errors::kInvalidDateTime;
     constexpr std::size_t kDatePart = 11;    // with the blank
     std::size_t length = date::ToEngineText(descriptor->Value(), workspace.small.data());
     const std::size_t skipped = descriptor->HasDate() ? 0 : kDatePart;
@@ -120,15 +121,15 @@ int FromRid(const Source& source, Workspace&, Datum& datum) {
 
 int FromRdd(const Source& source, Workspace&, Datum& datum) {
     const auto* descriptor = Live<RowIdDescriptor>(PointerAt(source.at));
-    if (!descriptor) return kBadObject;
-    if (!descriptor->value) return kBadRowId;
+    if (!descriptor) return errors::kBadObject;
+    if (!descriptor->value) return errors::kInvalidRowId;
     SetRowId(*descriptor->value, datum);
     return 0;
 }
 
 int RowIdFromText(Datum& datum) {
     rowid::RowId value;
-    if (!rowid::FromText(datum.Text(), &value)) return kBadRowId;
+    if (!rowid::FromText(datum.Text(), &value)) return errors::kInvalidRowId;
     SetRowId(value, datum);
     return 0;
 }

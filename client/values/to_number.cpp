@@ -2,6 +2,7 @@
 #include <cmath>
 #include <limits>
 
+#include "handles/errors.h"
 #include "number/decimal_float.h"
 #include "number/number.h"
 #include "oci.h"
@@ -55,7 +56,7 @@ int PutDecimal(const OCINumber& number, Workspace&, Target& target) {
 template <class Wide, class Narrow>
 int PutNarrow(Wide value, Target& target) {
     const auto narrow = static_cast<Narrow>(value);
-    if (static_cast<Wide>(narrow) != value) return kIntegerOverflow;
+    if (static_cast<Wide>(narrow) != value) return errors::kIntegerOverflow;
     return PutBytes(&narrow, sizeof narrow, target);
 }
 int PutInt(std::int64_t value, Workspace&, Target& target) {
@@ -81,14 +82,15 @@ int IntOfInteger(const Datum& datum, Workspace&, std::int64_t& value) {
 }
 int UintOfInteger(const Datum& datum, Workspace&, std::uint64_t& value) {
     value = static_cast<std::uint64_t>(datum.integer);
-    return datum.integer < 0 ? kIntegerOverflow : 0;
+    return datum.integer < 0 ? errors::kIntegerOverflow : 0;
 }
 // The fraction is cut. The upper limit is the power of two above, which a double holds exactly.
 template <class Integer>
 int IntegerOfBinaryReal(const Datum& datum, Workspace&, Integer& value) {
     const double whole = std::trunc(datum.real);
     constexpr double kEnd = std::numeric_limits<Integer>::digits == 64 ? 18446744073709551616.0 : 9223372036854775808.0;
-    if (!(whole >= static_cast<double>(std::numeric_limits<Integer>::min()) && whole < kEnd)) return kIntegerOverflow;
+    if (!(whole >= static_cast<double>(std::numeric_limits<Integer>::min()) && whole < kEnd))
+        return errors::kIntegerOverflow;
     value = static_cast<Integer>(whole);
     return 0;
 }
@@ -98,7 +100,7 @@ template <class Integer, auto render>
 int IntegerOfNumber(const Datum& datum, Workspace& workspace, Integer& value) {
     OCINumber number;
     if (const int error = render(datum, workspace, number)) return error;
-    return ToInteger(number, value) != 0 ? kIntegerOverflow : 0;
+    return ToInteger(number, value) != 0 ? errors::kIntegerOverflow : 0;
 }
 
 // What is a whole number but for the engine's binary arithmetic, is one: 4.35 * 100 is 435.
@@ -126,7 +128,7 @@ int RealOfNumber(const Datum& datum, Workspace& workspace, double& value) {
 int PutFlt(double value, Workspace&, Target& target) {
     if (target.size >= sizeof value) return PutBytes(&value, sizeof value, target);
     const auto narrow = static_cast<float>(value);
-    if (std::isinf(narrow) && !std::isinf(value)) return kNumericOverflow;
+    if (std::isinf(narrow) && !std::isinf(value)) return errors::kNumericOverflow;
     return PutBytes(&narrow, sizeof narrow, target);
 }
 
@@ -150,10 +152,10 @@ constexpr ByOrigin<OutConverter> kIntegerRow =
 int AsConversionError(int error) {
     switch (error) {
         case 0: return 0;
-        case number::kOverflow:
-        case number::kUnderflow:
-        case number::kNumericOverflow: return kNumericOverflow;
-        default: return kInvalidNumber;
+        case errors::kNumberOverflow:
+        case errors::kNumberUnderflow:
+        case errors::kNumericOverflow: return errors::kNumericOverflow;
+        default: return errors::kInvalidNumber;
     }
 }
 

@@ -8,6 +8,7 @@
 #include "date/date.h"
 #include "date/format.h"
 #include "handles/environment.h"
+#include "handles/errors.h"
 #include "number/number.h"
 #include "oci.h"
 #include "values/out_rows.h"
@@ -174,7 +175,7 @@ int RowIdText(const Datum& datum, Workspace& workspace, View& text) {
     return 0;
 }
 
-int NoText(const Datum&, Workspace&, View&) { return kInconsistentTypes; }
+int NoText(const Datum&, Workspace&, View&) { return errors::kInconsistentTypes; }
 
 // ---- How values become bytes
 
@@ -191,7 +192,7 @@ int BytesOfHex(const Datum& datum, Workspace& workspace, View& bytes) {
     workspace.text.assign((hex.size() + 1) / 2, '\0');
     for (std::size_t index = 0; index < hex.size(); ++index) {
         const int digit = HexDigit(hex[index]);
-        if (digit < 0) return kBadHex;
+        if (digit < 0) return errors::kBadHexadecimal;
         char& byte = workspace.text[(index + hex.size() % 2) / 2];
         byte = static_cast<char>(static_cast<unsigned char>(byte) << 4 | digit);
     }
@@ -223,7 +224,7 @@ std::size_t CopyCut(View text, const Workspace& workspace, char* at, std::size_t
     return stored;
 }
 
-int Outcome(const Target& target, std::size_t copied) { return copied < target.whole ? kTruncated : 0; }
+int Outcome(const Target& target, std::size_t copied) { return copied < target.whole ? errors::kTruncated : 0; }
 
 int PutChr(View utf8, Workspace& workspace, Target& target) {
     View text;
@@ -237,7 +238,7 @@ int PutStr(View utf8, Workspace& workspace, Target& target) {
     if (const int error = ToApplication(utf8, workspace, text)) return error;
     const std::size_t zero = workspace.utf16 ? 2 : 1;
     target.whole = text.size();
-    if (target.size < zero) return kTruncated;
+    if (target.size < zero) return errors::kTruncated;
     const std::size_t stored = CopyCut(text, workspace, target.at, target.size - zero, target);
     std::memset(target.at + stored, 0, zero);
     return Outcome(target, stored);
@@ -313,7 +314,7 @@ int ToApplication(View utf8, Workspace& workspace, View& text) {
     text = utf8;
     if (!workspace.utf16) return 0;
     workspace.units.clear();
-    if (!utf::ToUtf16(utf8, workspace.units)) return kBadCharacters;
+    if (!utf::ToUtf16(utf8, workspace.units)) return errors::kBadCharacters;
     text = workspace.units;
     return 0;
 }

@@ -11,13 +11,11 @@
 
 #include "engine/sqlite/connection.h"
 #include "engine/sqlite/errors.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
 
-constexpr int kBadLogon = 1017;
-constexpr int kBadOldPassword = 28008;
-constexpr int kInternalError = 600;
 constexpr const char* kHashMethod = "$y$";    // yescrypt
 
 constexpr const char* kCreate =
@@ -93,7 +91,7 @@ Status TakeOwnership(SqliteConnection& connection, const Credentials& credential
     if (status.Ok()) status = HasAccounts(connection, has_accounts);
     if (status.Ok() && !has_accounts) {
         const std::string hash = NewHash(credentials.password);
-        status = hash.empty() ? Error(kInternalError, "password cannot be hashed")
+        status = hash.empty() ? Error(errors::kInternalError, "password cannot be hashed")
                               : Run(connection, "insert into kelp_accounts(name, password) values(?1, ?2)",
                                     {Folded(credentials.user), hash}, nullptr, nullptr);
         taken = status.Ok();
@@ -109,8 +107,8 @@ Status Authenticate(SqliteConnection& connection, const Credentials& credentials
     bool has_accounts = false;
     Status status = HasAccounts(connection, has_accounts);
     if (status.Failed()) return status;
-    if (credentials.external) return !has_accounts || OwnsFile(connection) ? Status() : Error(kBadLogon);
-    if (!Usable(credentials.user) || !Usable(credentials.password)) return Error(kBadLogon);
+    if (credentials.external) return !has_accounts || OwnsFile(connection) ? Status() : Error(errors::kBadLogon);
+    if (!Usable(credentials.user) || !Usable(credentials.password)) return Error(errors::kBadLogon);
     if (!has_accounts) {
         bool taken = false;
         status = TakeOwnership(connection, credentials, taken);
@@ -120,7 +118,7 @@ Status Authenticate(SqliteConnection& connection, const Credentials& credentials
     bool found = false;
     status = FindHash(connection, credentials.user, hash, found);
     if (status.Failed()) return status;
-    return found && Matches(credentials.password, hash) ? Status() : Error(kBadLogon);
+    return found && Matches(credentials.password, hash) ? Status() : Error(errors::kBadLogon);
 }
 
 Status ChangePassword(SqliteConnection& connection, const std::string& user, const std::string& old_password,
@@ -130,10 +128,10 @@ Status ChangePassword(SqliteConnection& connection, const std::string& user, con
     std::string hash;
     if (status.Ok() && found) status = FindHash(connection, user, hash, found);
     if (status.Failed()) return status;
-    if (!found) return Error(kBadLogon);
-    if (!Matches(old_password, hash)) return Error(kBadOldPassword);
+    if (!found) return Error(errors::kBadLogon);
+    if (!Matches(old_password, hash)) return Error(errors::kBadOldPassword);
     const std::string new_hash = Usable(new_password) ? NewHash(new_password) : std::string();
-    if (new_hash.empty()) return Error(kBadLogon);
+    if (new_hash.empty()) return Error(errors::kBadLogon);
     connection.ReadAhead(nullptr);
     return Run(connection, "update kelp_accounts set password = ?2 where name = ?1", {Folded(user), new_hash}, nullptr,
                nullptr);

@@ -6,16 +6,12 @@
 
 #include "date/format.h"
 #include "engine/sqlite/column_types.h"
+#include "handles/errors.h"
 #include "number/number.h"
 
 namespace engine::sqlite {
 namespace {
 
-constexpr int kInconsistentTypes = 932;
-constexpr int kNumericOverflow = 1426;
-constexpr int kAbovePrecision = 1438;
-constexpr int kBadHex = 1465;
-constexpr int kTooLarge = 12899;
 constexpr std::int8_t kFloating = -127;
 
 constexpr std::int64_t kPowersOfTen[] = {1,
@@ -152,7 +148,7 @@ Status Coercion::ApplyNumber(Datum& value) {
             const int failure = number::FromPlainText(value.Text(), '.', &number_);
             return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
         }
-        default: return Refuse(kInconsistentTypes);
+        default: return Refuse(errors::kInconsistentTypes);
     }
 }
 
@@ -163,11 +159,11 @@ Status Coercion::ApplyDigits(Datum& value) {
     if (value.kind == Kind::decimal) return ApplyDecimal(*static_cast<const OCINumber*>(value.data), value);
     if (value.kind == Kind::integer) {
         if (!limited || (scale >= 0 && Fits(value.integer, precision - scale))) return {};
-        if (scale >= 0) return Refuse(kAbovePrecision);
+        if (scale >= 0) return Refuse(errors::kAbovePrecision);
         number::FromInt64(value.integer, &number_);
         return ApplyDecimal(number_, value);
     }
-    if (column_.type == SQLT_NUM && !(std::fabs(value.real) < kLargestNumber)) return Refuse(kNumericOverflow);
+    if (column_.type == SQLT_NUM && !(std::fabs(value.real) < kLargestNumber)) return Refuse(errors::kNumericOverflow);
     if (!limited || IsPlainReal(value.real, precision, scale)) return {};
     const int failure = number::FromReal15(value.real, &number_);
     return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
@@ -180,25 +176,26 @@ Status Coercion::ApplyBinary(Datum& value) {
         value.real = static_cast<double>(value.integer);
     } else if (value.kind == Kind::decimal) {
         const int failure = number::ToDouble(*static_cast<const OCINumber*>(value.data), &value.real);
-        if (failure != 0) return Refuse(kNumericOverflow);
+        if (failure != 0) return Refuse(errors::kNumericOverflow);
     }
     value.kind = Kind::real;
     if (column_.type == SQLT_IBDOUBLE) return {};
     const auto narrow = static_cast<float>(value.real);
-    if (std::isinf(narrow) && !std::isinf(value.real)) return Refuse(kNumericOverflow);
+    if (std::isinf(narrow) && !std::isinf(value.real)) return Refuse(errors::kNumericOverflow);
     value.real = number::WidenByDigits(narrow);
     return {};
 }
 
 Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {
-    if (!number::IsValid(number)) return Refuse(number::kInvalidNumber);
+    if (!number::IsValid(number)) return Refuse(errors::kInvalidNumber);
     number_ = number;
     int failure = 0;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) {
         failure = number::Prec(number_, column_.precision, &number_);
     } else if (column_.scale != kFloating) {
         failure = number::Round(number_, column_.scale, &number_);
-        if (failure == 0 && ExceedsPrecision(number_, column_.precision - column_.scale)) failure = kAbovePrecision;
+        if (failure == 0 && ExceedsPrecision(number_, column_.precision - column_.scale))
+            failure = errors::kAbovePrecision;
     }
     if (failure != 0) return Refuse(failure);
     Set(value, Kind::decimal, &number_, sizeof number_);
@@ -223,28 +220,29 @@ Status Coercion::ApplyText(Datum& value) {
 Status Coercion::ApplyBytes(Datum& value) {
     if (value.kind == Kind::text) {
         const std::string_view digits = value.Text();
-        if (digits.size() % 2 != 0) return Refuse(kBadHex);
+        if (digits.size() % 2 != 0) return Refuse(errors::kBadHexadecimal);
         text_.clear();
         for (std::size_t at = 0; at < digits.size(); at += 2) {
             const int high = HexDigit(digits[at]);
             const int low = HexDigit(digits[at + 1]);
-            if (high < 0 || low < 0) return Refuse(kBadHex);
+            if (high < 0 || low < 0) return Refuse(errors::kBadHexadecimal);
             text_.push_back(static_cast<char>(high * 16 + low));
         }
         Set(value, Kind::bytes, text_.data(), text_.size());
     }
-    return value.kind == Kind::bytes ? ApplySize(value) : Refuse(kInconsistentTypes);
+    return value.kind == Kind::bytes ? ApplySize(value) : Refuse(errors::kInconsistentTypes);
 }
 
 Status Coercion::ApplySize(const Datum& value) {
     const bool has_length = value.kind == Kind::text || value.kind == Kind::bytes || value.kind == Kind::timestamp;
     if (!has_length || column_.size == 0 || value.length <= column_.size) return {};
-    return Error(kTooLarge, "column " + column_.name + ", actual " + std::to_string(value.length) + ", maximum " +
-                                std::to_string(column_.size));
+    return Error(errors::kTooLarge,
+                 "column " + column_.name + ", actual " + std::to_string(value.length) + ", maximum " +
+                     std::to_string(column_.size));
 }
 
 Status Coercion::ApplyDate(Datum& value) {
-    if (value.kind != Kind::text && value.kind != Kind::timestamp) return Refuse(kInconsistentTypes);
+    if (value.kind != Kind::text && value.kind != Kind::timestamp) return Refuse(errors::kInconsistentTypes);
     constexpr std::size_t kPlainDate = 19;    // "YYYY-MM-DD HH:MM:SS"
     const std::string_view text = value.Text();
     const bool as_it_is = purpose_ == Purpose::compare || column_.type != SQLT_DAT || text.size() == kPlainDate;

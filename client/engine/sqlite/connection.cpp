@@ -11,6 +11,7 @@
 #include "engine/sqlite/functions.h"
 #include "engine/sqlite/query.h"
 #include "engine/sqlite/sqlite.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
@@ -19,11 +20,6 @@ using namespace std::chrono_literals;
 
 constexpr auto kLockWait = 2000ms;    // how long a call waits for another session's transaction
 constexpr int kStepsBetweenChecks = 2000;
-constexpr int kNotProperlyEnded = 933;
-constexpr int kNoStatement = 900;
-constexpr int kStatementTooLong = 1489;
-constexpr int kRolledBack = 2091;
-constexpr int kCancelled = 1013;
 constexpr std::size_t kLongestStatement = 1000000000;
 
 // Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
@@ -78,7 +74,7 @@ Status SqliteConnection::ChangePassword(const std::string& user, const std::stri
 }
 
 Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& query, std::uint32_t& error_offset) {
-    if (sql.size() > kLongestStatement) return Error(kStatementTooLong).From("SQLITE");
+    if (sql.size() > kLongestStatement) return Error(errors::kStatementTooLong).From("SQLITE");
     sqlite3* database = database_.get();
     int code = SQLITE_OK;
     std::size_t end = 0;
@@ -88,10 +84,10 @@ Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& q
         if (offset >= 0) error_offset = static_cast<std::uint32_t>(offset);
         return Failure(database, code);
     }
-    if (!statement) return Error(kNoStatement).From("SQLITE");
+    if (!statement) return Error(errors::kInvalidStatement).From("SQLITE");
     if (Compile(sql.substr(end), code, nullptr) || code != SQLITE_OK) {
         error_offset = static_cast<std::uint32_t>(end);
-        return Error(kNotProperlyEnded).From("SQLITE");
+        return Error(errors::kNotProperlyEnded).From("SQLITE");
     }
 
     ValueTargets targets = FindAssignments(database, sql);
@@ -129,9 +125,9 @@ Status SqliteConnection::Commit() {
     if (!InTransaction()) return {};
     Status status = Run("commit");
     if (!status.Ok() && !InTransaction()) return RolledBack(status);
-    if (status.Number() != 2291 && status.Number() != 2292) return status;
+    if (status.Number() != errors::kParentMissing && status.Number() != errors::kChildFound) return status;
     Status undone = Rollback();
-    return undone.Failed() ? undone : Error(kRolledBack, status.Detail()).From("SQLITE");
+    return undone.Failed() ? undone : Error(errors::kRolledBack, status.Detail()).From("SQLITE");
 }
 
 Status SqliteConnection::Rollback() {
@@ -193,7 +189,7 @@ Status SqliteConnection::Run(const char* sql) {
     if (code == SQLITE_OK) return {};
     if (!Cancelled()) return Failure(database_.get(), code);
     ForgetCancel();    // it ended the wait for a lock
-    return Error(kCancelled).From("SQLITE");
+    return Error(errors::kCancelled).From("SQLITE");
 }
 
 std::string SqliteConnection::Text(const char* sql) {

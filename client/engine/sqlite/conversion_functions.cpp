@@ -4,22 +4,21 @@
 
 #include "date/format.h"
 #include "engine/sqlite/function_values.h"
+#include "handles/errors.h"
 #include "number/format.h"
 
 namespace engine::sqlite {
 namespace {
 
-constexpr int kBadHexadecimal = 1465;
-constexpr int kBadNumberModel = 1481;
 constexpr std::size_t kLongestModelText = 512;    // models of numbers have 64 elements, those of dates 22 names
 
 // What the calls for numbers answer, as SQL tells it.
 int SqlNumber(number::Errno failure) {
     switch (failure) {
-        case number::kBadFormat: return kBadNumberModel;
-        case number::kBadText:
-        case number::kBadNumber: return number::kInvalidNumber;
-        case number::kOverflow: return number::kNumericOverflow;
+        case errors::kBadNumberFormat: return errors::kBadNumberModel;
+        case errors::kBadNumberText:
+        case errors::kBadNumber: return errors::kInvalidNumber;
+        case errors::kNumberOverflow: return errors::kNumericOverflow;
         default: return failure;
     }
 }
@@ -33,7 +32,7 @@ int NumberText(const OCINumber& number, std::string_view model, std::span<char> 
     const number::Nls nls;
     const int failure = number::ToText(number, model, nls, text.data(), text.size(), length);
     OCINumber larger;
-    if (failure != number::kRoundingOverflow || number::Shift(number, 1, &larger) != 0) return failure;
+    if (failure != errors::kRoundingOverflow || number::Shift(number, 1, &larger) != 0) return failure;
     return number::ToText(larger, model, nls, text.data(), text.size(), length);
 }
 
@@ -115,7 +114,7 @@ void HexToRaw(sqlite3_context* context, int count, Arguments arguments) {
     int high = 0;
     for (const char c : digits.Text()) {
         const int value = HexadecimalValue(c);
-        if (value < 0) return Refuse(context, kBadHexadecimal);
+        if (value < 0) return Refuse(context, errors::kBadHexadecimal);
         if (second) bytes.Append(static_cast<char>(high * 16 + value));
         high = value;
         second = !second;
@@ -126,7 +125,7 @@ void HexToRaw(sqlite3_context* context, int count, Arguments arguments) {
 // rawtohex(bytes or text)
 void RawToHex(sqlite3_context* context, int count, Arguments arguments) {
     if (AnyNull(count, arguments)) return sqlite3_result_null(context);
-    if (IsNumber(arguments[0])) return Refuse(context, kInconsistentTypes);
+    if (IsNumber(arguments[0])) return Refuse(context, errors::kInconsistentTypes);
     const std::string_view bytes = Bytes(arguments[0]);
     ResultText digits(bytes.size() * 2);
     if (!digits) return sqlite3_result_error_nomem(context);

@@ -6,11 +6,11 @@
 #include "date/format.h"
 #include "engine/sqlite/function_values.h"
 #include "engine/sqlite/pieces.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
 
-constexpr int kBadUnit = 1898;
 constexpr std::int64_t kSecondsOfDay = 86400;
 
 int SecondOfDay(const date::DateTime& value) { return (value.hour * 60 + value.minute) * 60 + value.second; }
@@ -46,7 +46,7 @@ void LastDay(sqlite3_context* context, int count, Arguments arguments) {
 int ReadWeekday(sqlite3_value* value, int& day_of_week) {
     if (!IsNumber(value)) return date::WeekdayFromName(TextOf(value), date::kEnglish, &day_of_week);
     std::int64_t number = 0;
-    if (ReadWhole(value, number) != 0 || number < 1 || number > 7) return date::kBadWeekday;
+    if (ReadWhole(value, number) != 0 || number < 1 || number > 7) return errors::kBadWeekday;
     day_of_week = static_cast<int>(number) - 1;
     return 0;
 }
@@ -159,7 +159,7 @@ constexpr UnitRow kUnits[] = {
 int CutDate(std::string_view unit, date::DateTime& value) {
     const auto* row = std::find_if(std::begin(kUnits), std::end(kUnits),
                                    [&](const UnitRow& candidate) { return IsWord(unit, candidate.word); });
-    return row == std::end(kUnits) ? kBadUnit : row->cut(value);
+    return row == std::end(kUnits) ? errors::kBadUnit : row->cut(value);
 }
 
 // trunc(date), trunc(date, unit), trunc(number), trunc(number, places). With a unit any text is to be a date.

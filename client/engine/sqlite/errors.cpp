@@ -1,6 +1,8 @@
 // Result codes and messages of SQLite: one table row a code or a beginning of a message.
 #include "engine/sqlite/errors.h"
 
+#include "handles/errors.h"
+
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
@@ -8,8 +10,6 @@
 
 namespace engine::sqlite {
 namespace {
-
-constexpr int kNoRoom = 1653;
 
 struct CodeRow {
     int code;      // extended or primary
@@ -21,30 +21,30 @@ constexpr CodeRow kCodes[] = {
     {SQLITE_CONSTRAINT_UNIQUE, 1},
     {SQLITE_CONSTRAINT_PRIMARYKEY, 1},
     {SQLITE_CONSTRAINT_ROWID, 1},
-    {SQLITE_CONSTRAINT_CHECK, 2290},
-    {SQLITE_CONSTRAINT_DATATYPE, 1722},
+    {SQLITE_CONSTRAINT_CHECK, errors::kCheckViolated},
+    {SQLITE_CONSTRAINT_DATATYPE, errors::kInvalidNumber},
     {SQLITE_CONSTRAINT_TRIGGER, 20000},
-    {SQLITE_CONSTRAINT, 2290},
+    {SQLITE_CONSTRAINT, errors::kCheckViolated},
     {SQLITE_BUSY_SNAPSHOT, 8177},
     {SQLITE_BUSY, 54},
     {SQLITE_LOCKED, 54},
     {SQLITE_PROTOCOL, 54},
-    {SQLITE_NOMEM, 1019},
+    {SQLITE_NOMEM, errors::kOutOfMemory},
     {SQLITE_READONLY, 16000},
-    {SQLITE_INTERRUPT, 1013},
-    {SQLITE_IOERR, 1115},
-    {SQLITE_CORRUPT, 1578},
-    {SQLITE_NOTADB, 1210},
-    {SQLITE_FULL, kNoRoom},
+    {SQLITE_INTERRUPT, errors::kCancelled},
+    {SQLITE_IOERR, errors::kInputOutputError},
+    {SQLITE_CORRUPT, errors::kCorruptFile},
+    {SQLITE_NOTADB, errors::kNoDatabaseFile},
+    {SQLITE_FULL, errors::kNoRoom},
     {SQLITE_CANTOPEN, 12154},
-    {SQLITE_PERM, 1031},
-    {SQLITE_AUTH, 1031},
-    {SQLITE_TOOBIG, 1489},
-    {SQLITE_MISMATCH, 1722},
-    {SQLITE_RANGE, 1036},
-    {SQLITE_SCHEMA, 1466},
-    {SQLITE_ABORT, 2091},
-    {SQLITE_NOLFS, 1115},
+    {SQLITE_PERM, errors::kInsufficientPrivileges},
+    {SQLITE_AUTH, errors::kInsufficientPrivileges},
+    {SQLITE_TOOBIG, errors::kStatementTooLong},
+    {SQLITE_MISMATCH, errors::kInvalidNumber},
+    {SQLITE_RANGE, errors::kNoSuchBind},
+    {SQLITE_SCHEMA, errors::kSchemaChanged},
+    {SQLITE_ABORT, errors::kRolledBack},
+    {SQLITE_NOLFS, errors::kInputOutputError},
 };
 
 // What SQLITE_ERROR means stands in its message alone.
@@ -55,39 +55,39 @@ struct WordsRow {
 };
 
 constexpr WordsRow kWords[] = {
-    {"no such table", "", 942},
-    {"no such view", "", 942},
-    {"unknown database", "", 942},
-    {"no such column", "", 904},
-    {"no such index", "", 1418},
+    {"no such table", "", errors::kNoSuchTable},
+    {"no such view", "", errors::kNoSuchTable},
+    {"unknown database", "", errors::kNoSuchTable},
+    {"no such column", "", errors::kInvalidIdentifier},
+    {"no such index", "", errors::kNoSuchIndex},
     {"no such trigger", "", 4043},
-    {"no such savepoint", "", 1086},
-    {"no such function", "", 904},
-    {"ambiguous column name", "", 918},
-    {"duplicate column name", "", 957},
-    {"wrong number of arguments", "", 909},
-    {"misuse of aggregate", "", 934},
-    {"misuse of window function", "", 934},
-    {"incomplete input", "", 921},
-    {"unrecognized token", "", 911},
-    {"a GROUP BY clause is required", "", 937},
-    {"aggregate functions are not allowed", "", 934},
-    {"SELECTs to the left and right", "", 1789},
-    {"all VALUES must have the same number", "", 1789},
-    {"sub-select returns", "", 913},
-    {"row value misused", "", 913},
-    {"foreign key mismatch", "", 2270},
-    {"not authorized", "", 1031},
-    {"cannot modify", "", 1031},
+    {"no such savepoint", "", errors::kNoSuchSavepoint},
+    {"no such function", "", errors::kInvalidIdentifier},
+    {"ambiguous column name", "", errors::kAmbiguousColumn},
+    {"duplicate column name", "", errors::kDuplicateColumn},
+    {"wrong number of arguments", "", errors::kWrongArgumentCount},
+    {"misuse of aggregate", "", errors::kAggregateNotAllowed},
+    {"misuse of window function", "", errors::kAggregateNotAllowed},
+    {"incomplete input", "", errors::kUnexpectedEnd},
+    {"unrecognized token", "", errors::kInvalidCharacter},
+    {"a GROUP BY clause is required", "", errors::kNotSingleGroup},
+    {"aggregate functions are not allowed", "", errors::kAggregateNotAllowed},
+    {"SELECTs to the left and right", "", errors::kColumnCountsDiffer},
+    {"all VALUES must have the same number", "", errors::kColumnCountsDiffer},
+    {"sub-select returns", "", errors::kTooManyValues},
+    {"row value misused", "", errors::kTooManyValues},
+    {"foreign key mismatch", "", errors::kKeyCountsDiffer},
+    {"not authorized", "", errors::kInsufficientPrivileges},
+    {"cannot modify", "", errors::kInsufficientPrivileges},
     {"cannot commit", "", 54},
-    {"", "already exists", 955},
-    {"", "already another table or index", 955},
-    {"", "may not be dropped", 1031},
-    {"", "may not be modified", 1031},
-    {"", "has no column named", 904},
-    {"", "integer overflow", 1426},
+    {"", "already exists", errors::kNameInUse},
+    {"", "already another table or index", errors::kNameInUse},
+    {"", "may not be dropped", errors::kInsufficientPrivileges},
+    {"", "may not be modified", errors::kInsufficientPrivileges},
+    {"", "has no column named", errors::kInvalidIdentifier},
+    {"", "integer overflow", errors::kNumericOverflow},
     {"", "not unique", 1},
-    {"", "may not be altered", 1031},
+    {"", "may not be altered", errors::kInsufficientPrivileges},
 };
 
 // "table t has 3 columns but 2 values were supplied", "2 values for 3 columns"
@@ -98,10 +98,10 @@ int CountMismatch(std::string_view message) {
     const std::size_t has = text.rfind(" has ");
     if (has != std::string::npos &&
         std::sscanf(text.c_str() + has, " has %d columns but %d values", &columns, &values) == 2) {
-        return values < columns ? 947 : 913;
+        return values < columns ? errors::kTooFewValues : errors::kTooManyValues;
     }
     const bool told = std::sscanf(text.c_str(), "%d values for %d columns", &values, &columns) == 2;
-    return !told ? 0 : values < columns ? 947 : 913;
+    return !told ? 0 : values < columns ? errors::kTooFewValues : errors::kTooManyValues;
 }
 
 int NumberOfWords(std::string_view message) {
@@ -109,16 +109,17 @@ int NumberOfWords(std::string_view message) {
         if (message.starts_with(row.begin) && message.find(row.contains) != std::string_view::npos) return row.number;
     }
     const int mismatch = CountMismatch(message);
-    return mismatch ? mismatch : 900;
+    return mismatch ? mismatch : errors::kInvalidStatement;
 }
 
 int NumberOf(int code, Verb verb, std::string_view message) {
-    if (code == SQLITE_CONSTRAINT_NOTNULL) return verb == Verb::update ? 1407 : 1400;
-    if (code == SQLITE_CONSTRAINT_FOREIGNKEY) return verb == Verb::remove ? 2292 : 2291;
+    if (code == SQLITE_CONSTRAINT_NOTNULL) return verb == Verb::update ? errors::kNullUpdated : errors::kNullInserted;
+    if (code == SQLITE_CONSTRAINT_FOREIGNKEY)
+        return verb == Verb::remove ? errors::kChildFound : errors::kParentMissing;
     for (const CodeRow& row : kCodes) {
         if (row.code == code || row.code == (code & 0xFF)) return row.number;
     }
-    return (code & 0xFF) == SQLITE_ERROR ? NumberOfWords(message) : 600;
+    return (code & 0xFF) == SQLITE_ERROR ? NumberOfWords(message) : errors::kInternalError;
 }
 
 // A write that has just failed at the limit of the process or the quota of the user: SQLite knows the full disk only,
@@ -143,7 +144,7 @@ Status Failure(sqlite3* database, int code, Verb verb) {
     const std::string_view words = sqlite3_errmsg(database);
     if (words.starts_with(kErrorMark)) return ToldByFunction(words.substr(kErrorMark.size()));
     const int told = (extended & 0xFF) == (code & 0xFF) ? extended : code;
-    const int number = MayNotGrow(told) ? kNoRoom : NumberOf(told, verb, words);
+    const int number = MayNotGrow(told) ? errors::kNoRoom : NumberOf(told, verb, words);
     return Error(number, std::string(words)).From("SQLITE");
 }
 

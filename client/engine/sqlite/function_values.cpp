@@ -6,6 +6,7 @@
 #include "date/format.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/stored_number.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
@@ -38,7 +39,7 @@ int ReadNumber(sqlite3_value* value, OCINumber& number) {
     switch (sqlite3_value_type(value)) {
         case SQLITE_INTEGER: number::FromInt64(sqlite3_value_int64(value), &number); return 0;
         case SQLITE_FLOAT: return number::FromReal15(sqlite3_value_double(value), &number);
-        case SQLITE_BLOB: return ReadNumberBlob(Bytes(value), number) ? 0 : number::kInvalidNumber;
+        case SQLITE_BLOB: return ReadNumberBlob(Bytes(value), number) ? 0 : errors::kInvalidNumber;
         default: return number::FromPlainText(TextOf(value), '.', &number);
     }
 }
@@ -99,11 +100,11 @@ void ReturnDate(sqlite3_context* context, const date::DateTime& value) {
 }
 
 int ReadDate(sqlite3_value* value, date::DateTime& result) {
-    if (sqlite3_value_type(value) != SQLITE_TEXT) return kInconsistentTypes;
+    if (sqlite3_value_type(value) != SQLITE_TEXT) return errors::kInconsistentTypes;
     const int failure = date::FromEngineText(TextOf(value), &result);
-    if (failure == 0) return result.month != 0 ? 0 : kInconsistentTypes;
+    if (failure == 0) return result.month != 0 ? 0 : errors::kInconsistentTypes;
     const int by_model = date::FromText(TextOf(value), date::kDateModel, date::kEnglish, date::Scope::date, &result);
-    return by_model != 0 && failure != date::kBadText ? failure : by_model;
+    return by_model != 0 && failure != errors::kTextMismatch ? failure : by_model;
 }
 
 bool IsDate(sqlite3_value* value, date::DateTime& result) {
@@ -140,7 +141,7 @@ int ReadWhole(sqlite3_value* value, std::int64_t& whole) {
     OCINumber number;
     const int failure = ReadNumber(value, number);
     if (failure != 0) return failure;
-    return number::ToInt64(number, &whole) == 0 ? 0 : number::kNumericOverflow;
+    return number::ToInt64(number, &whole) == 0 ? 0 : errors::kNumericOverflow;
 }
 
 ResultText::ResultText(std::size_t capacity) : bytes_(static_cast<char*>(sqlite3_malloc64(capacity + 1))) {}

@@ -20,9 +20,6 @@ namespace engine::sqlite {
 using Arguments = sqlite3_value**;
 
 constexpr int kAnyCount = -1;
-constexpr int kInconsistentTypes = 932;
-constexpr int kTooFewArguments = 938;
-constexpr int kOutOfRange = 1428;
 
 struct FunctionRow {
     const char* name;

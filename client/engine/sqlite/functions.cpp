@@ -13,6 +13,7 @@
 #include "engine/sqlite/function_values.h"
 #include "engine/sqlite/pieces.h"
 #include "engine/sqlite/stored_number.h"
+#include "handles/errors.h"
 #include "number/number.h"
 #include "oci.h"
 
@@ -64,7 +65,7 @@ template <bool padded>
 void ToText(sqlite3_context* context, int count, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
     const TextArgument value(arguments[0]);
-    if (value.Failure() != 0) return Refuse(context, number::kInvalidNumber);
+    if (value.Failure() != 0) return Refuse(context, errors::kInvalidNumber);
     std::string text(value.Text());
     const int limit = count > 1 ? sqlite3_value_int(arguments[1]) : padded ? 1 : 0;
     if (limit > 0) {

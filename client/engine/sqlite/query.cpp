@@ -8,13 +8,10 @@
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/describe.h"
 #include "engine/sqlite/stored_number.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
-
-constexpr int kCancelled = 1013;
-constexpr int kNotANumber = 1722;
-constexpr int kInconsistentTypes = 932;
 
 int Length(const Datum& value) { return static_cast<int>(value.length); }
 
@@ -97,13 +94,13 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
             break;
         case Kind::decimal: {
             const StoredNumber number = StoredNumber::From(*static_cast<const OCINumber*>(value.data));
-            if (number.form == StoredNumber::Form::null) return Error(kNotANumber);
+            if (number.form == StoredNumber::Form::null) return Error(errors::kInvalidNumber);
             if (number.form == StoredNumber::Form::integer) code = sqlite3_bind_int64(statement, index, number.integer);
             else if (number.form == StoredNumber::Form::real) code = sqlite3_bind_double(statement, index, number.real);
             else code = sqlite3_bind_blob(statement, index, number.blob, number.length, SQLITE_TRANSIENT);
             break;
         }
-        case Kind::cursor: return Error(kInconsistentTypes);
+        case Kind::cursor: return Error(errors::kInconsistentTypes);
     }
     return code == SQLITE_OK ? Status() : Failure(connection_.Database(), code);
 }
@@ -122,7 +119,7 @@ Status SqliteQuery::BindRow(RowSource& source, std::uint32_t row, bool copy) {
 Status SqliteQuery::Stopped(int code) {
     if (!connection_.Cancelled()) return Failure(connection_.Database(), code, verb_);
     connection_.ForgetCancel();
-    return Error(kCancelled).From("SQLITE");
+    return Error(errors::kCancelled).From("SQLITE");
 }
 
 Status SqliteQuery::Step(bool& has_row) {
@@ -156,7 +153,7 @@ Status SqliteQuery::ExecuteArray(RowSource& source, std::uint32_t first, std::ui
             continue;
         }
         if (in_transaction && !connection_.InTransaction()) return status;
-        const bool stop = !all_rows || status.Number() == kCancelled;
+        const bool stop = !all_rows || status.Number() == errors::kCancelled;
         outcome.failures.push_back({row, std::move(status)});
         if (stop) break;
     }

@@ -1,6 +1,8 @@
 // Rows in blocks of memory and, beyond a limit, of a temporary file.
 #include "engine/sqlite/row_store.h"
 
+#include "handles/errors.h"
+
 #include <algorithm>
 #include <cstring>
 
@@ -9,7 +11,6 @@ namespace {
 
 constexpr std::size_t kBlockSize = std::size_t{1} << 18;
 constexpr std::size_t kMemoryLimit = std::size_t{32} << 20;
-constexpr int kInputOutputError = 1115;
 
 bool HasBytes(Kind kind) {
     return kind == Kind::text || kind == Kind::bytes || kind == Kind::timestamp || kind == Kind::decimal;
@@ -54,10 +55,11 @@ char* RowStore::Reserve(std::size_t size) {
 
 Status RowStore::Spill(Block& block) {
     if (!file_) file_.reset(std::tmpfile());
-    if (!file_ || std::fseek(file_.get(), 0, SEEK_END) != 0) return Error(kInputOutputError, "no temporary file");
+    if (!file_ || std::fseek(file_.get(), 0, SEEK_END) != 0)
+        return Error(errors::kInputOutputError, "no temporary file");
     block.file_offset = std::ftell(file_.get());
     if (block.file_offset < 0 || std::fwrite(block.bytes.get(), 1, block.used, file_.get()) != block.used) {
-        return Error(kInputOutputError, "cannot write a temporary file");
+        return Error(errors::kInputOutputError, "cannot write a temporary file");
     }
     in_memory_ -= block.size;
     block.bytes.reset();
@@ -68,7 +70,7 @@ Status RowStore::Load(Block& block) {
     std::unique_ptr<char[]> bytes(new char[block.used]);
     if (std::fseek(file_.get(), block.file_offset, SEEK_SET) != 0 ||
         std::fread(bytes.get(), 1, block.used, file_.get()) != block.used) {
-        return Error(kInputOutputError, "cannot read a temporary file");
+        return Error(errors::kInputOutputError, "cannot read a temporary file");
     }
     block.bytes = std::move(bytes);
     return {};

@@ -4,6 +4,7 @@
 #include <string>
 
 #include "engine/sqlite/function_values.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
@@ -94,7 +95,7 @@ void InStr(sqlite3_context* context, int count, Arguments arguments) {
     int failure = text.Failure() != 0 ? text.Failure() : part.Failure();
     if (failure == 0 && count > 2) failure = ReadWhole(arguments[2], position);
     if (failure == 0 && count > 3) failure = ReadWhole(arguments[3], occurrence);
-    if (failure == 0 && occurrence < 1) failure = kOutOfRange;
+    if (failure == 0 && occurrence < 1) failure = errors::kOutOfRange;
     if (failure != 0) return Refuse(context, failure);
     if (part.Text().empty()) return sqlite3_result_null(context);
     const std::int64_t length = CharacterCount(text.Text());
@@ -146,7 +147,7 @@ int CompareValues(sqlite3_value* left, sqlite3_value* right, int& order) {
 // greatest(x, ...), least(x, ...)
 template <int wanted>
 void Extreme(sqlite3_context* context, int count, Arguments arguments) {
-    if (count < 1) return Refuse(context, kTooFewArguments);
+    if (count < 1) return Refuse(context, errors::kTooFewArguments);
     if (AnyNull(count, arguments)) return sqlite3_result_null(context);
     sqlite3_value* best = arguments[0];
     for (int index = 1; index < count; ++index) {
@@ -160,7 +161,7 @@ void Extreme(sqlite3_context* context, int count, Arguments arguments) {
 
 // decode(x, value, result, value, result, ..., otherwise): the result of the value that x is; a null is a null.
 void Decode(sqlite3_context* context, int count, Arguments arguments) {
-    if (count < 3) return Refuse(context, kTooFewArguments);
+    if (count < 3) return Refuse(context, errors::kTooFewArguments);
     const bool null = sqlite3_value_type(arguments[0]) == SQLITE_NULL;
     int index = 1;
     for (; index + 1 < count; index += 2) {

@@ -2,7 +2,7 @@
 #include <cmath>
 #include <limits>
 
-#include "statement_fixture.h"
+#include "support/statement_fixture.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 
 #include "core/state.h"
 #include "objects/text_conversion.h"
-#include "printed.h"
+#include "support/printed.h"
 
 namespace {
 

@@ -5,7 +5,7 @@
 #include <string>
 
 #include "core/command_table.h"
-#include "printed.h"
+#include "support/printed.h"
 #include "report/diagnostics.h"
 #include "report/trace.h"
 

@@ -6,7 +6,7 @@
 #include <limits>
 
 #include "number/decimal_float.h"
-#include "number_reference.h"
+#include "reference.h"
 
 namespace {
 
@@ -37,8 +37,8 @@ TEST(NumberIntegers, EndsOfEveryWidthAndSign) {
             }
             std::uint64_t bits = 0;
             OCINumber over = Whole(high + 1), fraction;
-            EXPECT_EQ(number::ToInteger(over, length, is_signed, &bits), number::kOverflow);
-            EXPECT_EQ(number::ToInteger(Whole(low - 1), length, is_signed, &bits), number::kUnderflow);
+            EXPECT_EQ(number::ToInteger(over, length, is_signed, &bits), 22053);
+            EXPECT_EQ(number::ToInteger(Whole(low - 1), length, is_signed, &bits), 22054);
             ASSERT_EQ(number::Sub(over, Number("1E-15"), &fraction), 0);
             EXPECT_EQ(number::ToInteger(fraction, length, is_signed, &bits), 0) << "a fraction is dropped";
         }
@@ -47,9 +47,9 @@ TEST(NumberIntegers, EndsOfEveryWidthAndSign) {
 
 TEST(NumberIntegers, WhatNoIntegerHolds) {
     std::uint64_t bits = 0;
-    EXPECT_EQ(number::ToInteger(Number("1E30"), 8, true, &bits), number::kOverflow);
-    EXPECT_EQ(number::ToInteger(Number("-1E125"), 8, true, &bits), number::kUnderflow);
-    EXPECT_EQ(number::ToInteger(Number("1"), 3, true, &bits), number::kBadIntegerLength);
+    EXPECT_EQ(number::ToInteger(Number("1E30"), 8, true, &bits), 22053);
+    EXPECT_EQ(number::ToInteger(Number("-1E125"), 8, true, &bits), 22054);
+    EXPECT_EQ(number::ToInteger(Number("1"), 3, true, &bits), 22057);
     EXPECT_EQ(number::ToInteger(Number("-0.5"), 1, false, &bits), 0);
     EXPECT_EQ(bits, 0u);
 }
@@ -74,10 +74,10 @@ TEST(NumberReals, ShortestDecimalOfTheReal) {
     OCINumber got;
     ASSERT_EQ(number::FromFloat(0.1f, &got), 0);
     EXPECT_EQ(got, Number("0.1"));
-    EXPECT_EQ(number::FromDouble(1e126, &got), number::kOverflow);
-    EXPECT_EQ(number::FromDouble(-std::numeric_limits<double>::infinity(), &got), number::kOverflow);
-    EXPECT_EQ(number::FromDouble(std::nan(""), &got), number::kBadNumber);
-    EXPECT_EQ(number::FromDouble(5e-324, &got), number::kUnderflow);
+    EXPECT_EQ(number::FromDouble(1e126, &got), 22053);
+    EXPECT_EQ(number::FromDouble(-std::numeric_limits<double>::infinity(), &got), 22053);
+    EXPECT_EQ(number::FromDouble(std::nan(""), &got), 22060);
+    EXPECT_EQ(number::FromDouble(5e-324, &got), 22054);
 }
 
 TEST(NumberReals, NearestRealOfTheNumber) {
@@ -101,8 +101,8 @@ TEST(NumberReals, NearestRealOfTheNumber) {
     }
     float real = 0;
     EXPECT_EQ(number::ToFloat(Number("3.4028235E38"), &real), 0);
-    EXPECT_EQ(number::ToFloat(Number("3.5E38"), &real), number::kOverflow);
-    EXPECT_EQ(number::ToFloat(Number("-1E-60"), &real), number::kUnderflow);
+    EXPECT_EQ(number::ToFloat(Number("3.5E38"), &real), 22053);
+    EXPECT_EQ(number::ToFloat(Number("-1E-60"), &real), 22054);
     EXPECT_EQ(number::ToFloat(Number("1.0000000596046447753906251"), &real), 0);
     EXPECT_EQ(real, std::nextafter(1.0f, 2.0f)) << "just above a tie of two floats, though not of two doubles";
 }
@@ -219,10 +219,10 @@ TEST(NumberDecimalFloat, RoundsToItsDigitsAndRefusesWhatIsNoNumber) {
     const struct {
         std::uint64_t bits;
         number::Errno error;
-    } special[] = {{0x7800000000000000, number::kOverflow},   // infinity
-                   {0x7C00000000000000, number::kBadNumber},  // NaN
-                   {0x5FE0000000000001, number::kOverflow},   // 1E369
-                   {0x0000000000000001, number::kUnderflow},  // 1E-398
+    } special[] = {{0x7800000000000000, 22053},   // infinity
+                   {0x7C00000000000000, 22060},  // NaN
+                   {0x5FE0000000000001, 22053},   // 1E369
+                   {0x0000000000000001, 22054},  // 1E-398
                    {0x6FFFFFFFFFFFFFFF, 0}};                  // a coefficient of more than 16 digits counts as 0
     for (const auto& c : special) EXPECT_EQ(number::FromDecimalFloat(&c.bits, 8, &got), c.error) << std::hex << c.bits;
     EXPECT_EQ(got, Number("0"));

@@ -9,7 +9,7 @@
 
 #include "date/zone.h"
 #include "date/zone_rules.h"
-#include "date_reading.h"
+#include "reading.h"
 
 namespace {
 
@@ -18,9 +18,9 @@ using namespace date;
 TEST(Zone, OffsetsByTheirText) {
     const struct { const char* zone; int minutes; Errno number; } cases[] = {
         {"+05:30", 330, 0},        {"-08:00", -480, 0},       {"+5", 300, 0},           {"-00:30", -30, 0},
-        {"+14:00", 840, 0},        {"+14:01", 0, kBadZoneHour}, {"-12:00", -720, 0},    {"-12:01", 0, kBadZoneHour},
-        {"-13:00", 0, kBadZoneHour}, {"+05:60", 0, kBadZoneMinute}, {"+", 0, kBadZone}, {"+a", 0, kBadZone},
-        {"+05:", 0, kBadZone},     {"+05:30x", 0, kBadZone},  {"+123", 0, kBadZone}};
+        {"+14:00", 840, 0},        {"+14:01", 0, 1874}, {"-12:00", -720, 0},    {"-12:01", 0, 1874},
+        {"-13:00", 0, 1874}, {"+05:60", 0, 1875}, {"+", 0, 1857}, {"+a", 0, 1857},
+        {"+05:", 0, 1857},     {"+05:30x", 0, 1857},  {"+123", 0, 1857}};
     for (const auto& c : cases) {
         DateTime value = Read("2024-01-01");
         EXPECT_EQ(SetZone(c.zone, &value), c.number) << c.zone;
@@ -61,7 +61,7 @@ TEST(Zone, NamesThatAreNoRegions) {
         EXPECT_FALSE(value.has_zone) << name;
     }
     DateTime value = Read("2024-01-01");
-    EXPECT_EQ(SetZone(std::string(100000, 'x'), &value), kUnknownRegion);
+    EXPECT_EQ(SetZone(std::string(100000, 'x'), &value), 1882);
 }
 
 TEST(Zone, ComparesMoments) {
@@ -83,8 +83,8 @@ TEST(Zone, SeesAMomentElsewhere) {
     ASSERT_EQ(ToOffset(Read("2024-01-01 00:30:00 +05:30"), -480, &moved), 0);
     char text[kMaxEngineText];
     EXPECT_EQ(std::string(text, ToEngineText(moved, text)), "2023-12-31 11:00:00 -08:00");
-    EXPECT_EQ(ToOffset(Read("9999-12-31 23:30:00 +00:00"), 60, &moved), kBadYear);
-    EXPECT_EQ(ToOffset(Read("-4712-01-01 00:30:00 +01:00"), 0, &moved), kBadYear);
+    EXPECT_EQ(ToOffset(Read("9999-12-31 23:30:00 +00:00"), 60, &moved), 1841);
+    EXPECT_EQ(ToOffset(Read("-4712-01-01 00:30:00 +01:00"), 0, &moved), 1841);
 }
 
 std::string FileBytes(const std::string& path) {

@@ -2,7 +2,7 @@
 #include <algorithm>
 #include <cstdlib>
 
-#include "statement_fixture.h"
+#include "support/statement_fixture.h"
 
 namespace {
 

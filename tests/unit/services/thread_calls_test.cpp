@@ -3,7 +3,7 @@
 #include <thread>
 #include <vector>
 
-#include "call_fixture.h"
+#include "support/call_fixture.h"
 
 namespace {
 

@@ -2,7 +2,7 @@
 // that no application should pass.
 #include <array>
 
-#include "statement_fixture.h"
+#include "support/statement_fixture.h"
 
 namespace {
 

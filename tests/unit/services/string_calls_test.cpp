@@ -2,7 +2,7 @@
 #include <cstdlib>
 #include <vector>
 
-#include "call_fixture.h"
+#include "support/call_fixture.h"
 
 namespace {
 

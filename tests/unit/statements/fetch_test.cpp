@@ -1,5 +1,5 @@
 // Fetching: arrays, indicators and codes, orientations, exact fetches, pieces, and the descriptions of columns.
-#include "statement_fixture.h"
+#include "support/statement_fixture.h"
 
 namespace {
 

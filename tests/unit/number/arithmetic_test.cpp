@@ -1,7 +1,7 @@
 // Arithmetic on numbers, against exact fractions.
 #include <gtest/gtest.h>
 
-#include "number_reference.h"
+#include "reference.h"
 
 namespace {
 
@@ -147,9 +147,9 @@ TEST(NumberArithmetic, PrecisionCountsFromTheFirstDigit) {
         EXPECT_EQ(got, Number(c.result)) << c.value << " to " << c.digits;
     }
     OCINumber got;
-    EXPECT_EQ(number::Prec(Number("1"), 0, &got), number::kBadArgument);
-    EXPECT_EQ(number::Shift(Number("1"), 2147483647, &got), number::kOverflow);
-    EXPECT_EQ(number::Shift(Number("1"), -2147483647 - 1, &got), number::kUnderflow);
+    EXPECT_EQ(number::Prec(Number("1"), 0, &got), 21560);
+    EXPECT_EQ(number::Shift(Number("1"), 2147483647, &got), 22053);
+    EXPECT_EQ(number::Shift(Number("1"), -2147483647 - 1, &got), 22054);
     EXPECT_EQ(number::Round(Number("1"), -2147483647 - 1, &got), 0);
     EXPECT_EQ(got, Number("0"));
 }
@@ -160,14 +160,14 @@ TEST(NumberArithmetic, RangeAndDomainErrors) {
         const char* left;
         const char* right;
         number::Errno error;
-    } cases[] = {{number::Add, "9.9E125", "9.9E125", number::kOverflow},
-                 {number::Mul, "1E100", "1E26", number::kOverflow},
-                 {number::Mul, "1E-100", "1E-31", number::kUnderflow},
-                 {number::Sub, "1.01E-130", "1E-130", number::kUnderflow},
-                 {number::Div, "1", "0", number::kDividedByZero},
-                 {number::Div, "0", "0", number::kDividedByZero},
-                 {number::Mod, "5", "0", number::kDividedByZero},
-                 {number::Div, "1E-100", "1E31", number::kUnderflow}};
+    } cases[] = {{number::Add, "9.9E125", "9.9E125", 22053},
+                 {number::Mul, "1E100", "1E26", 22053},
+                 {number::Mul, "1E-100", "1E-31", 22054},
+                 {number::Sub, "1.01E-130", "1E-130", 22054},
+                 {number::Div, "1", "0", 22056},
+                 {number::Div, "0", "0", 22056},
+                 {number::Mod, "5", "0", 22056},
+                 {number::Div, "1E-100", "1E31", 22054}};
     for (const auto& c : cases) {
         OCINumber got;
         EXPECT_EQ(c.function(Number(c.left), Number(c.right), &got), c.error) << c.left << " " << c.right;
@@ -182,10 +182,10 @@ TEST(NumberArithmetic, BytesThatAreNoNumber) {
         OCINumber got;
         int tested = 0;
         EXPECT_FALSE(number::IsValid(value)) << int{value.OCINumberPart[0]} << " " << int{value.OCINumberPart[1]};
-        EXPECT_EQ(number::Add(value, Number("1"), &got), number::kBadNumber);
-        EXPECT_EQ(number::Sub(Number("1"), value, &got), number::kBadNumber);
-        EXPECT_EQ(number::Sin(value, &got), number::kBadNumber);
-        EXPECT_EQ(number::Compare(value, value, &tested), number::kBadNumber);
+        EXPECT_EQ(number::Add(value, Number("1"), &got), 22060);
+        EXPECT_EQ(number::Sub(Number("1"), value, &got), 22060);
+        EXPECT_EQ(number::Sin(value, &got), 22060);
+        EXPECT_EQ(number::Compare(value, value, &tested), 22060);
     }
 }
 
@@ -237,6 +237,6 @@ TEST(NumberArithmetic, InfinitiesCompareButDoNotCompute) {
     OCINumber got;
     ASSERT_EQ(number::Neg(plus, &got), 0);
     EXPECT_EQ(got, minus);
-    EXPECT_EQ(number::Add(plus, minus, &got), number::kOverflow);
-    EXPECT_EQ(number::Cos(plus, &got), number::kOverflow);
+    EXPECT_EQ(number::Add(plus, minus, &got), 22053);
+    EXPECT_EQ(number::Cos(plus, &got), 22053);
 }

@@ -63,29 +63,29 @@ TEST(Calendar, FlagsAndErrorOfEachField) {
     constexpr Flags kDay = OCI_DATE_INVALID_DAY, kMonth = OCI_DATE_INVALID_MONTH, kYear = OCI_DATE_INVALID_YEAR;
     const struct { DateTime value; Flags flags; Errno number; } cases[] = {
         {Day(2024, 2, 29), 0, 0},
-        {Day(2023, 2, 29), kDay, kBadDayForMonth},
-        {Day(1900, 2, 29), kDay, kBadDayForMonth},
+        {Day(2023, 2, 29), kDay, 1839},
+        {Day(1900, 2, 29), kDay, 1839},
         {Day(1500, 2, 29), 0, 0},
         {Day(-5, 2, 29), 0, 0},
-        {Day(-4, 2, 29), kDay, kBadDayForMonth},
-        {Day(2024, 4, 31), kDay, kBadDayForMonth},
-        {Day(2024, 1, 32), kDay, kBadDay},
-        {Day(2024, 1, 0), kDay | OCI_DATE_DAY_BELOW_VALID, kBadDay},
-        {Day(2024, 0, 1), kMonth | OCI_DATE_MONTH_BELOW_VALID, kBadMonth},
-        {Day(2024, 13, 31), kMonth, kBadMonth},
-        {Day(0, 1, 1), OCI_DATE_YEAR_ZERO, kBadYear},
-        {Day(-4713, 1, 1), kYear | OCI_DATE_YEAR_BELOW_VALID, kBadYear},
-        {Day(10000, 1, 1), kYear, kBadYear},
-        {Day(1582, 10, 5), OCI_DATE_DAY_MISSING_FROM_1582, kNotInCalendar},
-        {Day(1582, 10, 14), OCI_DATE_DAY_MISSING_FROM_1582, kNotInCalendar},
-        {{.year = 2024, .month = 1, .day = 1, .hour = 24}, OCI_DATE_INVALID_HOUR, kBadHour},
-        {{.year = 2024, .month = 1, .day = 1, .minute = 60}, OCI_DATE_INVALID_MINUTE, kBadMinute},
-        {{.year = 2024, .month = 1, .day = 1, .second = 60}, OCI_DATE_INVALID_SECOND, kBadSecond},
-        {{.year = 2024, .month = 1, .day = 1, .nanosecond = 1'000'000'000}, 0, kBadFraction},
+        {Day(-4, 2, 29), kDay, 1839},
+        {Day(2024, 4, 31), kDay, 1839},
+        {Day(2024, 1, 32), kDay, 1847},
+        {Day(2024, 1, 0), kDay | OCI_DATE_DAY_BELOW_VALID, 1847},
+        {Day(2024, 0, 1), kMonth | OCI_DATE_MONTH_BELOW_VALID, 1843},
+        {Day(2024, 13, 31), kMonth, 1843},
+        {Day(0, 1, 1), OCI_DATE_YEAR_ZERO, 1841},
+        {Day(-4713, 1, 1), kYear | OCI_DATE_YEAR_BELOW_VALID, 1841},
+        {Day(10000, 1, 1), kYear, 1841},
+        {Day(1582, 10, 5), OCI_DATE_DAY_MISSING_FROM_1582, 1864},
+        {Day(1582, 10, 14), OCI_DATE_DAY_MISSING_FROM_1582, 1864},
+        {{.year = 2024, .month = 1, .day = 1, .hour = 24}, OCI_DATE_INVALID_HOUR, 1850},
+        {{.year = 2024, .month = 1, .day = 1, .minute = 60}, OCI_DATE_INVALID_MINUTE, 1851},
+        {{.year = 2024, .month = 1, .day = 1, .second = 60}, OCI_DATE_INVALID_SECOND, 1852},
+        {{.year = 2024, .month = 1, .day = 1, .nanosecond = 1'000'000'000}, 0, 1880},
         {{.year = 0, .month = 13, .day = 0, .hour = 99, .minute = 99, .second = 99},
          OCI_DATE_YEAR_ZERO | kMonth | kDay | OCI_DATE_DAY_BELOW_VALID | OCI_DATE_INVALID_HOUR |
              OCI_DATE_INVALID_MINUTE | OCI_DATE_INVALID_SECOND,
-         kBadYear}};
+         1841}};
     for (const auto& c : cases) {
         EXPECT_EQ(Check(c.value), c.flags) << EngineText(c.value);
         EXPECT_EQ(Validate(c.value), c.number) << EngineText(c.value);
@@ -108,14 +108,14 @@ TEST(Calendar, AddsMonths) {
 
 TEST(Calendar, ResultsOutOfRange) {
     DateTime result = Day(1999, 9, 9);
-    EXPECT_EQ(AddDays(Day(9999, 12, 31), 1, &result), kBadYear);
-    EXPECT_EQ(AddDays(Day(-4712, 1, 1), -1, &result), kBadYear);
-    EXPECT_EQ(AddDays(Day(2024, 1, 1), INT64_MAX, &result), kBadYear);
-    EXPECT_EQ(AddDays(Day(2024, 1, 1), INT64_MIN, &result), kBadYear);
-    EXPECT_EQ(AddMonths(Day(9999, 12, 1), 1, &result), kBadYear);
-    EXPECT_EQ(AddMonths(Day(-4712, 1, 1), -1, &result), kBadYear);
-    EXPECT_EQ(AddMonths(Day(2024, 1, 1), INT32_MIN, &result), kBadYear);
-    EXPECT_EQ(NextDay(Day(9999, 12, 31), 0, &result), kBadYear);
+    EXPECT_EQ(AddDays(Day(9999, 12, 31), 1, &result), 1841);
+    EXPECT_EQ(AddDays(Day(-4712, 1, 1), -1, &result), 1841);
+    EXPECT_EQ(AddDays(Day(2024, 1, 1), INT64_MAX, &result), 1841);
+    EXPECT_EQ(AddDays(Day(2024, 1, 1), INT64_MIN, &result), 1841);
+    EXPECT_EQ(AddMonths(Day(9999, 12, 1), 1, &result), 1841);
+    EXPECT_EQ(AddMonths(Day(-4712, 1, 1), -1, &result), 1841);
+    EXPECT_EQ(AddMonths(Day(2024, 1, 1), INT32_MIN, &result), 1841);
+    EXPECT_EQ(NextDay(Day(9999, 12, 31), 0, &result), 1841);
     EXPECT_EQ(result, Day(1999, 9, 9));
 }
 
@@ -168,10 +168,10 @@ TEST(DateForms, SevenBytes) {
 
 TEST(DateForms, SevenBytesThatAreNoDate) {
     const struct { std::vector<std::uint8_t> bytes; Errno number; } cases[] = {
-        {{0, 0, 0, 0, 0, 0, 0}, kBadYear},          {{100, 100, 1, 1, 1, 1, 1}, kBadYear},
-        {{255, 255, 1, 1, 1, 1, 1}, kBadYear},      {{120, 124, 13, 1, 1, 1, 1}, kBadMonth},
-        {{120, 124, 2, 30, 1, 1, 1}, kBadDayForMonth}, {{120, 124, 2, 1, 0, 1, 1}, kBadHour},
-        {{120, 124, 2, 1, 1, 61, 1}, kBadMinute},   {{120, 124, 2, 1, 1, 1, 0}, kBadSecond}};
+        {{0, 0, 0, 0, 0, 0, 0}, 1841},          {{100, 100, 1, 1, 1, 1, 1}, 1841},
+        {{255, 255, 1, 1, 1, 1, 1}, 1841},      {{120, 124, 13, 1, 1, 1, 1}, 1843},
+        {{120, 124, 2, 30, 1, 1, 1}, 1839}, {{120, 124, 2, 1, 0, 1, 1}, 1850},
+        {{120, 124, 2, 1, 1, 61, 1}, 1851},   {{120, 124, 2, 1, 1, 1, 0}, 1852}};
     for (const auto& c : cases) {
         DateTime value;
         EXPECT_EQ(FromBytes(c.bytes.data(), &value), c.number) << ::testing::PrintToString(c.bytes);
@@ -199,14 +199,14 @@ TEST(DateForms, EngineTextIsReadInAllItsShapes) {
 
 TEST(DateForms, EngineTextThatIsRefused) {
     const struct { const char* text; Errno number; } cases[] = {
-        {"", kBadText}, {"-", kBadText}, {"2024", kBadText}, {"2024-", kBadText}, {"2024-02", kBadText},
-        {"2024-02-29x", kBadText}, {"2024-02-29 ", kBadText}, {"2024-02-29 12", kBadText},
-        {"2024-02-29 12:00:00.", kBadText}, {"2024-02-29 12:00:00 +", kBadText},
-        {"2024-02-29 12:00:00 +1:", kBadText}, {"2024-02-29 12:00:00 +16:00", kBadText},
-        {"2024-02-29 12:00:00 +05:30x", kBadText}, {"-12:00", kBadText}, {"100:00", kBadText},
-        {"12345678-01-01", kBadYear}, {"10000-01-01", kBadYear}, {"0000-01-01", kBadYear},
-        {"2023-02-29", kBadDayForMonth}, {"2024-13-01", kBadMonth}, {"24:00", kBadHour},
-        {"2024-02-29 12:60:00", kBadMinute}, {"1582-10-10", kNotInCalendar}};
+        {"", 1861}, {"-", 1861}, {"2024", 1861}, {"2024-", 1861}, {"2024-02", 1861},
+        {"2024-02-29x", 1861}, {"2024-02-29 ", 1861}, {"2024-02-29 12", 1861},
+        {"2024-02-29 12:00:00.", 1861}, {"2024-02-29 12:00:00 +", 1861},
+        {"2024-02-29 12:00:00 +1:", 1861}, {"2024-02-29 12:00:00 +16:00", 1861},
+        {"2024-02-29 12:00:00 +05:30x", 1861}, {"-12:00", 1861}, {"100:00", 1861},
+        {"12345678-01-01", 1841}, {"10000-01-01", 1841}, {"0000-01-01", 1841},
+        {"2023-02-29", 1839}, {"2024-13-01", 1843}, {"24:00", 1850},
+        {"2024-02-29 12:60:00", 1851}, {"1582-10-10", 1864}};
     for (const auto& c : cases) {
         DateTime value;
         EXPECT_EQ(FromEngineText(c.text, &value), c.number) << c.text;

@@ -6,7 +6,7 @@
 #include <filesystem>
 #include <fstream>
 
-#include "call_fixture.h"
+#include "support/call_fixture.h"
 
 namespace {
 

@@ -12,7 +12,7 @@
 #include "objects/value_assignment.h"
 #include "objects/value_display.h"
 #include "oci.h"
-#include "printed.h"
+#include "support/printed.h"
 
 namespace {
 

@@ -2,7 +2,7 @@
 #include <atomic>
 #include <thread>
 
-#include "statement_fixture.h"
+#include "support/statement_fixture.h"
 
 namespace {
 

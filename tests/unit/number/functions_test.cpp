@@ -5,7 +5,7 @@
 #include <thread>
 #include <vector>
 
-#include "number_reference.h"
+#include "reference.h"
 
 namespace {
 
@@ -32,9 +32,9 @@ public:
         OCINumber wanted;
         number::Errno wanted_error;
         if (mpfr_inf_p(value_) || (mpfr_regular_p(value_) && mpfr_get_exp(value_) > 500)) {
-            wanted_error = number::kOverflow;
+            wanted_error = 22053;
         } else if (underflow_ || (mpfr_regular_p(value_) && mpfr_get_exp(value_) < -500)) {
-            wanted_error = number::kUnderflow;
+            wanted_error = 22054;
         } else {
             Fraction exact;
             mpfr_get_q(exact, value_);
@@ -79,7 +79,7 @@ void ExpectEverywhere(const OCINumber& value) {
     for (const Function& row : kInverse) {
         OCINumber got;
         if (beyond > 0) {
-            ASSERT_EQ(row.function(value, &got), number::kBadNumber) << row.name << " " << Shown(value);
+            ASSERT_EQ(row.function(value, &got), 22060) << row.name << " " << Shown(value);
         } else {
             ASSERT_NO_FATAL_FAILURE(ExpectFunction(row, value));
         }
@@ -89,7 +89,7 @@ void ExpectEverywhere(const OCINumber& value) {
     const Function logarithm{"ln", number::Ln, mpfr_log};
     OCINumber got;
     if (sign <= 0) {
-        ASSERT_EQ(number::Ln(value, &got), number::kBadNumber) << Shown(value);
+        ASSERT_EQ(number::Ln(value, &got), 22060) << Shown(value);
     } else {
         ASSERT_NO_FATAL_FAILURE(ExpectFunction(logarithm, value));
     }
@@ -181,7 +181,7 @@ TEST(NumberFunctions, PowersThatAreExact) {
     OCINumber got;
     ASSERT_EQ(number::Log(Number("4"), Number("8"), &got), 0);
     EXPECT_EQ(got, Number("1.5"));
-    ASSERT_EQ(number::IntPower(Number("1.5"), -2147483647 - 1, &got), number::kUnderflow);
+    ASSERT_EQ(number::IntPower(Number("1.5"), -2147483647 - 1, &got), 22054);
     ASSERT_EQ(number::IntPower(Number("-1"), 2147483647, &got), 0);
     EXPECT_EQ(got, Number("-1"));
 }
@@ -193,17 +193,17 @@ TEST(NumberFunctions, OutsideTheDomain) {
         const char* right;
         number::Errno error;
     } cases[] = {
-        {number::Power, "0", "-1", number::kDividedByZero}, {number::Power, "-2", "0.5", number::kBadNumber},
-        {number::Log, "1", "5", number::kBadNumber},        {number::Log, "0", "5", number::kBadNumber},
-        {number::Log, "-2", "5", number::kBadNumber},       {number::Log, "2", "0", number::kBadNumber},
-        {number::ArcTan2, "0", "0", number::kBadNumber},    {number::Power, "10", "126", number::kOverflow},
-        {number::Power, "10", "-131", number::kUnderflow},  {number::Power, "9E125", "9E125", number::kOverflow}};
+        {number::Power, "0", "-1", 22056}, {number::Power, "-2", "0.5", 22060},
+        {number::Log, "1", "5", 22060},        {number::Log, "0", "5", 22060},
+        {number::Log, "-2", "5", 22060},       {number::Log, "2", "0", 22060},
+        {number::ArcTan2, "0", "0", 22060},    {number::Power, "10", "126", 22053},
+        {number::Power, "10", "-131", 22054},  {number::Power, "9E125", "9E125", 22053}};
     for (const auto& c : cases) {
         OCINumber got;
         EXPECT_EQ(c.function(Number(c.left), Number(c.right), &got), c.error) << c.left << " " << c.right;
     }
     OCINumber got;
-    EXPECT_EQ(number::Sqrt(Number("-1E-130"), &got), number::kBadNumber);
+    EXPECT_EQ(number::Sqrt(Number("-1E-130"), &got), 22060);
 }
 
 TEST(NumberFunctions, FromSeveralThreads) {

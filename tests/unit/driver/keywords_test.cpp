@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "core/keywords.h"
-#include "printed.h"
+#include "support/printed.h"
 
 namespace {
 

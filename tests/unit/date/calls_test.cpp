@@ -1,7 +1,7 @@
 // The calls on dates and datetime descriptors.
 #include <cstring>
 
-#include "call_fixture.h"
+#include "support/call_fixture.h"
 
 namespace {
 

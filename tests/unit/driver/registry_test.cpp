@@ -5,7 +5,7 @@
 
 #include "objects/buffers.h"
 #include "objects/registry.h"
-#include "printed.h"
+#include "support/printed.h"
 
 namespace {
 

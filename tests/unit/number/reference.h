@@ -92,8 +92,8 @@ public:
         unsigned long digits[20];
         for (int i = 19; i >= 0; --i) digits[i] = mpz_fdiv_q_ui(whole, whole, 100);
         mpz_clears(whole, limit, nullptr);
-        if (exponent > 62) return number::kOverflow;
-        if (exponent < -65) return number::kUnderflow;
+        if (exponent > 62) return 22053;
+        if (exponent < -65) return 22054;
         Write(digits, exponent, sign < 0, result);
         return 0;
     }
