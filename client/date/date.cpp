@@ -58,6 +58,17 @@ void SetDay(int year, int month, int day, DateTime* value) {
     value->day = static_cast<std::uint8_t>(day);
 }
 
+// Whether that led to the next day's first second.
+bool AddSecond(DateTime* value) {
+    if (++value->second < 60) return false;
+    value->second = 0;
+    if (++value->minute < 60) return false;
+    value->minute = 0;
+    if (++value->hour < 24) return false;
+    value->hour = 0;
+    return true;
+}
+
 template <class T>
 int Order(const T& left, const T& right) { return left < right ? -1 : right < left; }
 
@@ -160,6 +171,22 @@ Errno NextDay(const DateTime& value, int day_of_week, DateTime* result) noexcept
     if (const Errno number = Validate(value)) return number;
     const int days = (day_of_week - DayOfWeek(ToDayNumber(value)) + 7) % 7;
     return AddDays(value, days == 0 ? 7 : days, result);
+}
+
+// A month of 0 is a time without a date.
+Errno RoundFraction(const DateTime& value, int digits, DateTime* result) noexcept {
+    if (const Errno number = value.month == 0 ? ValidateTime(value) : Validate(value)) return number;
+    constexpr std::uint32_t kSecond = 1'000'000'000;
+    std::uint32_t unit = kSecond;
+    for (int place = 0; place < digits && unit > 1; ++place) unit /= 10;
+    const std::uint32_t rounded = (value.nanosecond + unit / 2) / unit * unit;
+    DateTime moved = value;
+    moved.nanosecond = rounded % kSecond;
+    if (rounded == kSecond && AddSecond(&moved) && moved.month != 0) {
+        if (const Errno number = AddDays(moved, 1, &moved)) return number;
+    }
+    *result = moved;
+    return 0;
 }
 
 std::int32_t DaysBetween(const DateTime& left, const DateTime& right) noexcept {

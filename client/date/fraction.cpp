@@ -14,8 +14,8 @@ constexpr std::uint32_t kSecond = 1'000'000'000;    // in nanoseconds
 std::uint32_t Unit() {
     static const std::uint32_t unit = [] {
         char value[16];
-        IniReadString("kelpcli.ini", "kelpci", "fraction", "microseconds", value, sizeof value);
-        return std::string_view(value) == "nanoseconds" ? 1U : 1000U;
+        IniReadString("kelpcli.ini", "kelpci", "fraction", "nanoseconds", value, sizeof value);
+        return std::string_view(value) == "microseconds" ? 1000U : 1U;
     }();
     return unit;
 }

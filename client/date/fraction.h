@@ -1,4 +1,4 @@
-// Fractions of a second as the datetime calls take and give them: microseconds, or nanoseconds when the key `fraction`
+// Fractions of a second as the datetime calls take and give them: nanoseconds, or microseconds when the key `fraction`
 // in section `kelpci` of kelpcli.ini says so. The key is read once, at the first call.
 #pragma once
 

@@ -1,5 +1,5 @@
 // The datetime package: calls on datetime descriptors. Each published function and its twin whose name ends in NS do
-// the same. Fractions are microseconds, or nanoseconds when kelpcli.ini says so.
+// the same. Fractions are nanoseconds, or microseconds when kelpcli.ini says so.
 #include "date/descriptor.h"
 #include "date/fraction.h"
 #include "entry/text_argument.h"

@@ -127,23 +127,25 @@ TEST_F(DateCalls, TextsInUtf16) {
 TEST_F(DateCalls, TypesHaveTheirParts) {
     const struct { ub4 type; const char* date; const char* time; } cases[] = {
         {OCI_DTYPE_DATE, "2024-7-15", "1878"},
-        {OCI_DTYPE_TIME, "1878", "13:14:15.250000"},
-        {OCI_DTYPE_TIME_TZ, "1878", "13:14:15.250000"},
-        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.250000"},
-        {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.250000"},
-        {OCI_DTYPE_TIMESTAMP_LTZ, "2024-7-15", "13:14:15.250000"},
-        {OCI_DTYPE_INTERVAL_YM, "2024-7-15", "13:14:15.250000"}};    // the general type
+        {OCI_DTYPE_TIME, "1878", "13:14:15.250000000"},
+        {OCI_DTYPE_TIME_TZ, "1878", "13:14:15.250000000"},
+        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.250000000"},
+        {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.250000000"},
+        {OCI_DTYPE_TIMESTAMP_LTZ, "2024-7-15", "13:14:15.250000000"},
+        {OCI_DTYPE_INTERVAL_YM, "2024-7-15", "13:14:15.250000000"}};    // the general type
     for (const auto& c : cases) {
         OCIDateTime* value = NewDateTime(c.type);
         const bool has_date = std::string_view(c.date) != "1878", has_time = std::string_view(c.time) != "1878";
         EXPECT_EQ(DateOf(value), has_date ? "1866" : "1878") << c.type << " unset";
-        EXPECT_EQ(Answer(Construct(value, "+02:00", 250000)), 0) << c.type;
+        EXPECT_EQ(Answer(Construct(value, "+02:00", 250000000)), 0) << c.type;
         EXPECT_EQ(DateOf(value), c.date) << c.type;
         EXPECT_EQ(TimeOf(value), c.time) << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, 2000, 2, 30)), has_date ? 1839 : 1878) << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, -44, 3, 15)), has_date ? 0 : 1878) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 999999999)), has_time ? 0 : 1878) << c.type;
+        EXPECT_EQ(TimeOf(value), has_time ? "1:2:3.999999999" : "1878") << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 4)), has_time ? 0 : 1878) << c.type;
-        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 1000000)), 1880) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 1000000000)), 1880) << c.type;
         ub4 flags = 1;
         EXPECT_EQ(Answer(OCIDateTimeCheckNS(env_, err_, value, &flags)), 0) << c.type;
         EXPECT_EQ(flags, 0u) << c.type;
@@ -185,6 +187,20 @@ TEST_F(DateCalls, ComparisonCrossesZones) {
         EXPECT_EQ(order, c.order) << c.zone;
     }
     EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, india, time, &order)), 1870);
+}
+
+// Whatever stands behind a zone of length 0, and before a closing zero in a longer one, it is that of the session.
+TEST_F(DateCalls, AZoneWithoutLengthIsThatOfTheSession) {
+    OCIDateTime* plain = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
+    OCIDateTime* other = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
+    ASSERT_EQ(Answer(Construct(plain)), 0);
+    const struct { const char* zone; std::size_t length; } cases[] = {{"+13:45", 0}, {"", 0}, {"\0+13:45", 7}};
+    for (const auto& c : cases) {
+        sword order = 9;
+        EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, other, 2024, 7, 15, 13, 14, 15, 0, Text(c.zone), c.length)), 0);
+        EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, plain, other, &order)), 0);
+        EXPECT_EQ(order, 0) << c.length;
+    }
 }
 
 TEST_F(DateCalls, DatetimesRefuseNullAndForeignPointers) {
