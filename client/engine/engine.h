@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "engine/datum.h"
+#include "engine/dialect.h"
 #include "handles/status.h"
 
 namespace engine {
@@ -67,23 +68,6 @@ public:
     virtual Status Fetch(std::span<Datum> values, bool& more) = 0;
     // Ends an open query early; harmless when none is open.
     virtual void Close() noexcept = 0;
-};
-
-// How an engine's SQL differs from what applications write; read by the SQL scanner.
-struct Dialect {
-    struct Spelling {
-        std::string_view written;    // a word of the application's, lower case
-        std::string_view engine;     // what the engine knows for it
-    };
-    char placeholder_mark = '?';             // before the placeholder's number: ?1, $1
-    std::span<const Spelling> types;         // replaced as whole words in definition statements and casts
-    std::span<const Spelling> functions;     // replaced as whole words in expressions
-    std::span<const Spelling> casts;         // type, function: "cast(e as T(a, b))" becomes "F(e, a, b)"
-    bool has_dual = false;                   // whether "from dual" is understood as it stands
-    bool has_minus = false;                  // whether "minus select" is; "except" where it is not
-    bool has_for_update = false;             // whether "for update" is; cut off where it is not
-    bool has_date_literals = false;          // whether date '...' and timestamp '...' are; plain texts where not
-    bool has_truncate = false;               // whether "truncate table" is; "delete from" where it is not
 };
 
 struct Credentials {

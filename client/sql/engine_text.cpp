@@ -74,7 +74,7 @@ private:
         result_.placeholders.push_back(static_cast<std::uint32_t>(found - all.begin()));
         const bool has_indicator = IsIndicator(tokens_, index + 1);
         Replace(token, tokens_[index + has_indicator].End(),
-                dialect_.placeholder_mark + std::to_string(result_.placeholders.size()));
+                dialect_.placeholder(result_.placeholders.size()));
         return index + 1 + has_indicator;
     }
 
@@ -82,8 +82,10 @@ private:
     void VisitLiteral(std::size_t index) {
         const Token& token = tokens_[index];
         rowid::RowId value;
-        if (row_ids_[index] && rowid::FromText(token.text.substr(1, token.text.size() - 2), &value))
-            Replace(token, token.End(), std::to_string(value.row));
+        if (!row_ids_[index] || !dialect_.row_id_literal) return;
+        if (!rowid::FromText(token.text.substr(1, token.text.size() - 2), &value)) return;
+        engine::RowId row;
+        if (rowid::ToBytes(value, row.bytes.data())) Replace(token, token.End(), dialect_.row_id_literal(row));
     }
 
     void VisitSymbol(std::size_t index) {
@@ -105,15 +107,16 @@ private:
         if (IsTypePlace(index)) return VisitType(index);
         const bool in_type_size = !open_.empty() && open_.back().is_type_size;
         if (in_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
-        if (token.Is("dual") && Previous(index).Is("from") && !dialect_.has_dual) {
-            const bool named = FollowedByAlias(index);
-            Replace(token, token.End(), named ? "(select 'X' as dummy)" : "(select 'X' as dummy) as dual");
-        } else if (token.Is("minus") && At(tokens_, index + 1).Is("select") && !dialect_.has_minus) {
-            Replace(token, token.End(), "except");
-        } else if (token.Is("truncate") && index == 0 && At(tokens_, 1).Is("table") && !dialect_.has_truncate) {
-            Replace(token, tokens_[1].End(), "delete from");
+        if (token.Is("dual") && Previous(index).Is("from") && !dialect_.dual.empty()) {
+            std::string table(dialect_.dual);
+            Replace(token, token.End(), FollowedByAlias(index) ? table : table + " as dual");
+        } else if (token.Is("minus") && At(tokens_, index + 1).Is("select") && !dialect_.minus.empty()) {
+            Replace(token, token.End(), dialect_.minus);
+        } else if (token.Is("truncate") && index == 0 && At(tokens_, 1).Is("table") &&
+                   !dialect_.truncate_table.empty()) {
+            Replace(token, tokens_[1].End(), dialect_.truncate_table);
             return index + 2;
-        } else if (token.Is("for") && step_.locks_rows && !dialect_.has_for_update && open_.empty() &&
+        } else if (token.Is("for") && step_.locks_rows && dialect_.cuts_for_update && open_.empty() &&
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);
         } else if (!cast_as_.empty() && cast_as_[index] > 0) {
@@ -222,19 +225,16 @@ private:
     }
 
     bool IsDateLiteral(std::size_t index) const {
-        return (tokens_[index].Is("date") || tokens_[index].Is("timestamp")) && !dialect_.has_date_literals &&
+        return (tokens_[index].Is("date") || tokens_[index].Is("timestamp")) && dialect_.date_literal &&
                tokens_[index + 1].kind == TokenKind::literal;
     }
 
-    // date '2024-2-9' becomes the text in which dates are kept; what is no date stays as it is.
+    // date '2024-2-9' becomes what the engine writes for it; what is no date stays as it is.
     std::size_t VisitDateLiteral(std::size_t index) {
         const Token& literal = tokens_[index + 1];
         date::DateTime value;
         if (date::FromEngineText(literal.text.substr(1, literal.text.size() - 2), &value) != 0) return index + 2;
-        std::array<char, date::kMaxEngineText + 2> plain{'\''};
-        std::size_t length = 1 + date::ToEngineText(value, plain.data() + 1);
-        plain[length++] = '\'';
-        Replace(tokens_[index], literal.End(), {plain.data(), length});
+        Replace(tokens_[index], literal.End(), dialect_.date_literal(value));
         return index + 2;
     }
 

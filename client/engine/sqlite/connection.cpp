@@ -31,6 +31,21 @@ constexpr Dialect::Spelling kTypes[] = {
     {"timestamp with time zone", "timestamp_tz"},
 };
 
+std::string Placeholder(std::size_t number) { return '?' + std::to_string(number); }
+
+// The text in which dates are kept.
+std::string DateLiteral(const date::DateTime& value) {
+    char text[date::kMaxEngineText];
+    return "'" + std::string(text, date::ToEngineText(value, text)) + "'";
+}
+
+// The number of the row, most significant byte first, behind two bytes for the table.
+std::string RowIdLiteral(const RowId& row) {
+    std::uint64_t number = 0;
+    for (std::size_t index = 2; index < row.bytes.size(); ++index) number = number << 8 | row.bytes[index];
+    return std::to_string(static_cast<std::int64_t>(number));
+}
+
 }  // namespace
 
 Status Connect(const std::string& file, std::unique_ptr<Connection>& connection) {
@@ -144,7 +159,18 @@ std::string SqliteConnection::ServerVersion() {
 }
 
 const Dialect& SqliteConnection::GetDialect() const {
-    static constexpr Dialect kDialect{'?', kTypes, kMoments, kCasts, false, false, false, false, false};
+    static constexpr Dialect kDialect{
+        .placeholder = Placeholder,
+        .types = kTypes,
+        .functions = kMoments,
+        .casts = kCasts,
+        .dual = "(select 'X' as dummy)",
+        .minus = "except",
+        .truncate_table = "delete from",
+        .cuts_for_update = true,
+        .date_literal = DateLiteral,
+        .row_id_literal = RowIdLiteral,
+    };
     return kDialect;
 }
 

@@ -16,11 +16,22 @@ constexpr engine::Dialect::Spelling kFunctions[] = {{"sysdate", "(now())"}};
 constexpr engine::Dialect::Spelling kCasts[] = {{"timestamp", "to_ts"}, {"char", "to_char"}};
 
 engine::Dialect TestDialect() {
-    engine::Dialect dialect;
-    dialect.types = kTypes;
-    dialect.functions = kFunctions;
-    dialect.casts = kCasts;
-    return dialect;
+    return {
+        .placeholder = [](std::size_t number) { return '?' + std::to_string(number); },
+        .types = kTypes,
+        .functions = kFunctions,
+        .casts = kCasts,
+        .dual = "(select 'X' as dummy)",
+        .minus = "except",
+        .truncate_table = "delete from",
+        .cuts_for_update = true,
+        .date_literal =
+            [](const date::DateTime& value) {
+                char text[date::kMaxEngineText];
+                return "'" + std::string(text, date::ToEngineText(value, text)) + "'";
+            },
+        .row_id_literal = [](const engine::RowId& row) { return std::to_string(row.bytes.back()); },
+    };
 }
 
 std::string Rewritten(std::string_view text) {
