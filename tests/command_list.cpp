@@ -4,7 +4,7 @@
 #include <cstdio>
 #include <string>
 
-#include "core/dispatch.h"
+#include "loop/dispatch.h"
 
 namespace {
 

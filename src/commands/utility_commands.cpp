@@ -96,13 +96,13 @@ void Pause(const CommandRow& row, int count, char** words) {
 void DebugMemory(const CommandRow&, int, char**) {}
 
 constexpr PlainCommand kUtilityCommands[] = {
-    {{50, kAnyWords, ""}, SetOption},
-    {{52, kAnyWords, "ReadIni [keyword]\n"}, ReadIni},
-    {{51, Words(2, 3), "WriteIni keyword [value]\n"}, WriteIni},
-    {{367, Words(2), "DeleteFile filename\n"}, DeleteFile},
-    {{413, Words(3), "setlocale category locale\n"}, SetLocale},
-    {{406, kAnyWords, "pause sleep_in_milliseconds"}, Pause},
-    {{446, Words(1), "memDebug\n"}, DebugMemory},
+    {{Code::opt, kAnyWords, ""}, SetOption},
+    {{Code::readini, kAnyWords, "ReadIni [keyword]\n"}, ReadIni},
+    {{Code::writeini, Words(2, 3), "WriteIni keyword [value]\n"}, WriteIni},
+    {{Code::deletefile, Words(2), "DeleteFile filename\n"}, DeleteFile},
+    {{Code::setlocale, Words(3), "setlocale category locale\n"}, SetLocale},
+    {{Code::pause, kAnyWords, "pause sleep_in_milliseconds"}, Pause},
+    {{Code::memdebug, Words(1), "memDebug\n"}, DebugMemory},
 };
 
 }  // namespace

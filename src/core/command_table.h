@@ -1,23 +1,37 @@
-// The commands: the table of words and codes, and how a code reaches its handler. What a command looks like (code, word
-// counts, usage text, and whatever tells it from its siblings) is a row; rows of one shape share one handler.
+// The commands: their words and codes, and how a code reaches its handler. What a command looks like (code, word
+// counts, usage text, and whatever tells it from its siblings) is a row; rows of one shape share one handler. All of it
+// is set up at start-up and only read afterwards.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <span>
 
+// What a command is called in rows and in trace lines: Code::ocinumberadd.
+enum class Code : int {
+#define COMMAND(word, code) word = (code),
+#include "core/commands.def"
+};
+
 struct Command {
     const char* word;  // lower case; null in the closing row
-    int code;
+    Code code;
 };
 
 // In lookup order, closed by a row without a word: the first row that a typed word begins is the command.
 extern const Command kCommandTable[];
-inline constexpr int kCommandCount = 268;
-inline constexpr int kHighestCommandCode = 452;
 
 // The first row that the word, in any case, begins; null when there is none. The word must not be empty.
 const Command* FindCommand(const char* word);
+
+// Each code once, as the list has them.
+inline constexpr Code kCommandCodes[] = {
+#define COMMAND(word, code) Code::word,
+#include "core/commands.def"
+};
+inline constexpr int kHighestCommandCode = static_cast<int>(std::ranges::max(kCommandCodes));
+inline constexpr int kCodeLimit = 1000;  // codes stay below it: they are places in tables
 
 // The word counts a command takes, the command word included.
 struct WordCounts {
@@ -47,7 +61,7 @@ inline constexpr WordCounts kAnyWords{1, true};
 // What every row of every shape begins with. A count that `words` does not hold prints the usage text as invalid syntax
 // and nothing else happens: the dispatcher sees to that, no handler does.
 struct CommandRow {
-    int code;
+    Code code;
     WordCounts words;
     const char* usage;
 };
@@ -57,7 +71,8 @@ struct PlainCommand : CommandRow {
     void (*run)(const CommandRow& row, int count, char** words);
 };
 
-// Code to handler. A family of commands adds its rows once, at start-up; the rows must live as long as the process.
+// Code to handler. A family of commands adds its rows once, at start-up; the rows must live as long as the process. A
+// code that is no command's, or has a handler already, is a fault of the program and ends it with a message.
 class HandlerTable {
 public:
     struct Handler {
@@ -79,7 +94,7 @@ public:
         for (const PlainCommand& row : rows) Set(row, row.run);
     }
     // Null when no family has added the code.
-    const Handler* Find(int code) const;
+    const Handler* Find(Code code) const;
 
 private:
     void Set(const CommandRow& row, void (*run)(const CommandRow&, int, char**));

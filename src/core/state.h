@@ -11,6 +11,12 @@ struct OCIError;
 
 extern OCIEnv* DefaultEnvironment;      // made most recently; used by commands that are given none
 extern OCIError* DefaultErrorHandle;    // the first error handle made since the last one here was freed
+inline void AdoptErrorHandle(OCIError* error) {
+    if (DefaultErrorHandle == nullptr) DefaultErrorHandle = error;
+}
+inline void ForgetErrorHandle(const void* error) {
+    if (DefaultErrorHandle == error) DefaultErrorHandle = nullptr;
+}
 extern std::atomic<bool> Utf16Mode;     // texts go to the library, and come from it, in UTF-16
 
 extern uint32_t application_code_page;  // of the process, as the platform reports it

@@ -121,12 +121,9 @@ int AllocateBuffer(MemBuffer& buffer, void* statement, uint32_t element_size, ui
     buffer.lengths = buffer.call_lengths = nullptr;
     buffer.return_codes = buffer.call_return_codes = nullptr;
     buffer.array_size = array_size;
-    buffer.previous_lengths = buffer.piece_lengths = nullptr;
-    buffer.dynamic_lengths = 0;
+    buffer.dynamic = {};
     buffer.holds_pointers = false;
     buffer.current_element = 0;
-    buffer.dynamic_list = nullptr;
-    buffer.dynamic_count = 0;
     if (!ObtainBlocks(buffer)) return -1;
     buffer.call_data = buffer.data;
     buffer.call_indicators = buffer.indicators;
@@ -142,10 +139,10 @@ void FreeBufferBlocks(MemBuffer& buffer) {
     FreeBlock(buffer.indicators);
     FreeBlock(buffer.lengths);
     FreeBlock(buffer.return_codes);
-    FreeBlock(buffer.previous_lengths);
-    FreeBlock(buffer.piece_lengths);
-    FreeBlock(buffer.dynamic_list);
-    buffer.dynamic_count = 0;
+    FreeBlock(buffer.dynamic.previous_lengths);
+    FreeBlock(buffer.dynamic.piece_lengths);
+    FreeBlock(buffer.dynamic.list);
+    buffer.dynamic.list_count = 0;
     buffer.call_data = nullptr;
     buffer.call_indicators = nullptr;
     buffer.call_lengths = nullptr;

@@ -11,6 +11,17 @@
 // element even after a script has changed the type.
 inline constexpr size_t kElementSlack = 64;
 
+struct MemBuffer;
+
+// What dynamic binds and defines keep with a buffer. The three blocks are the buffer's own, null until one is needed.
+struct DynamicData {
+    uint32_t* previous_lengths; // one an element each: the pieces that a callback has received,
+    uint32_t* piece_lengths;    // and the piece under way
+    uint32_t lengths_count;     // not 0: an element's length is the sum of its two entries above
+    MemBuffer** list;           // the buffers that a bind hands out, one an iteration
+    uint32_t list_count;
+};
+
 struct MemBuffer {
     bool in_use;
     void* statement;            // null: made without one
@@ -31,13 +42,9 @@ struct MemBuffer {
     uint16_t* call_return_codes;
     uint32_t array_size;
     char name[36];
-    uint32_t* previous_lengths; // one an element each: the pieces a dynamic callback has received,
-    uint32_t* piece_lengths;    // and the piece under way; null until one is needed
-    uint32_t dynamic_lengths;   // not 0: an element's length is the sum of the two entries above
     bool holds_pointers;        // elements are locators, descriptors or handles
     uint32_t current_element;   // of PL/SQL arrays: the count that calls read and write
-    MemBuffer** dynamic_list;   // the buffers that a dynamic bind hands out, one an iteration
-    uint32_t dynamic_count;
+    DynamicData dynamic;
 
     unsigned char* Element(uint32_t index) const { return data + size_t{index} * element_size; }
     // False when an allocation has failed half-way: elements must not be touched then.

@@ -1,10 +1,10 @@
-// The kinds and their slots, and the one search, registration and release for all of them.
+// The kinds and their tables, and the one search, registration and release for all of them. Command thread only.
 #include "objects/registry.h"
 
-#include <algorithm>
 #include <array>
 #include <iterator>
 #include <string_view>
+#include <utility>
 
 #include "core/keywords.h"
 #include "core/messages.h"
@@ -48,18 +48,25 @@ constexpr KindInfo kKinds[] = {
 };
 static_assert(std::size(kKinds) == static_cast<size_t>(Kind::ldainfo) + 1);
 
-constexpr size_t kHandleKinds = static_cast<size_t>(Kind::thnd) + 1;  // those whose slots are NamedObjects
-constexpr int kKeyAreaSize = 80;
+constexpr size_t kHandleKinds = static_cast<size_t>(Kind::thnd) + 1;  // those whose tables are here
 
-// Where each kind's slots begin in the one array that holds them all.
-constexpr auto kFirstSlot = [] {
-    std::array<int, kHandleKinds + 1> first{};
-    for (size_t kind = 0; kind < kHandleKinds; ++kind) first[kind + 1] = first[kind] + kKinds[kind].capacity;
-    return first;
-}();
+template <Kind kKind> RecordOf<kKind> slots[kKinds[static_cast<size_t>(kKind)].capacity];
 
-NamedObject all_slots[kFirstSlot[kHandleKinds]];
-unsigned char key_areas[kKinds[static_cast<size_t>(Kind::key)].capacity][kKeyAreaSize];
+// Makes a slot as new as one that never held anything.
+template <Kind kKind> void Clear(NamedObject& slot) {
+    static_cast<RecordOf<kKind>&>(slot) = {};
+}
+template <> void Clear<Kind::key>(NamedObject& slot) {
+    slot = {};
+}
+
+struct SlotTable {
+    Slots slots;
+    void (*clear)(NamedObject& slot);
+};
+constinit const auto kTables = []<size_t... kKind>(std::index_sequence<kKind...>) {
+    return std::array{SlotTable{Slots(slots<static_cast<Kind>(kKind)>), Clear<static_cast<Kind>(kKind)>}...};
+}(std::make_index_sequence<kHandleKinds>());
 
 bool IsDescriptor(Kind kind) {
     return kind >= Kind::lob && kind <= Kind::datetime;
@@ -90,8 +97,9 @@ DescriptorReference LookUp(Kind kind, const char* word) {
     found.slot = FindByName(kind, name);
     if (found.slot == nullptr) return found;
     found.object = found.slot->object;
-    found.is_array = found.slot->array_count != 0;
-    if (found.is_array && indexed && found.index >= 0 && found.index < long{found.slot->array_count}) {
+    const NamedDescriptor* const descriptor = AsDescriptor(kind, found.slot);
+    found.is_array = descriptor != nullptr && descriptor->array_count != 0;
+    if (found.is_array && indexed && found.index >= 0 && found.index < long{descriptor->array_count}) {
         found.object = static_cast<void**>(found.object)[found.index];
         found.is_array = false;
     }
@@ -104,11 +112,13 @@ const KindInfo& InfoOf(Kind kind) {
     return kKinds[static_cast<size_t>(kind)];
 }
 
-std::span<NamedObject> SlotsOf(Kind kind) {
+NamedDescriptor* AsDescriptor(Kind kind, NamedObject* slot) {
+    return IsDescriptor(kind) ? static_cast<NamedDescriptor*>(slot) : nullptr;
+}
+
+Slots SlotsOf(Kind kind) {
     const auto index = static_cast<size_t>(kind);
-    if (index >= kHandleKinds) return {};
-    return std::span(all_slots).subspan(static_cast<size_t>(kFirstSlot[index]),
-                                        static_cast<size_t>(kKinds[index].capacity));
+    return index < kHandleKinds ? kTables[index].slots : Slots();
 }
 
 void* InvalidObject() {
@@ -173,19 +183,17 @@ NamedObject* Register(Kind kind, const char* name, void* object, void* parent) {
         Message(kError, "Variable name NULL not allowed\n");
         return nullptr;
     }
-    const std::span<NamedObject> slots = SlotsOf(kind);
-    const auto slot = std::ranges::find(slots, false, &NamedObject::in_use);
-    if (slot == slots.end()) {
-        ReportOverflow(kind);
-        return nullptr;
+    for (NamedObject& slot : SlotsOf(kind)) {
+        if (slot.in_use) continue;
+        kTables[static_cast<size_t>(kind)].clear(slot);
+        slot.in_use = true;
+        slot.object = object;
+        slot.parent = parent;
+        std::strncpy(slot.name, name, static_cast<size_t>(InfoOf(kind).name_width) - 1);
+        return &slot;
     }
-    *slot = NamedObject{};
-    slot->in_use = true;
-    slot->object = object;
-    slot->parent = parent;
-    std::strncpy(slot->name, name, static_cast<size_t>(InfoOf(kind).name_width) - 1);
-    if (kind == Kind::key) slot->area = key_areas[slot - slots.begin()];
-    return &*slot;
+    ReportOverflow(kind);
+    return nullptr;
 }
 
 void Release(Kind kind, const char* name) {

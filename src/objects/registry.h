@@ -1,7 +1,7 @@
 // Named objects: for each kind a fixed table from the name a script gives to the pointer the library returned.
 // Tables are searched from slot 0, so the lowest free slot is filled first. Names are cut to the slot's width before
 // they are stored or compared, and are unique within a kind only. Used by the command thread only; nothing here
-// locks.
+// locks. A slot is a record: that of its kind where the kind has fields of its own, else a NamedObject.
 #pragma once
 
 #include <cstddef>
@@ -14,7 +14,7 @@ enum class Kind : uint8_t {
     environment, error, svc, server, session, trans, spool, cpool, stmt, describe, bind, define, param,
     lob, result, rowid, file, datetime,  // descriptors: may be arrays, names may carry an index
     string, raw, mutex, key, tid, thnd,
-    buffer, memory_struct, cursor, ldainfo  // records of their own, in tables of their own
+    buffer, memory_struct, cursor, ldainfo  // in tables elsewhere
 };
 
 struct KindInfo {
@@ -25,20 +25,90 @@ struct KindInfo {
 };
 const KindInfo& InfoOf(Kind kind);
 
+// --- Records -------------------------------------------------------------------------------------------------------
+
 struct NamedObject {
-    bool in_use;            // release clears this and nothing else
-    uint16_t lob_type;      // lob: the external type, such as 112
-    uint32_t lob_flag;      // lob
-    uint32_t array_count;   // descriptors: elements of the array, 0 for a single descriptor
-    uint32_t utf16_mode;    // stmt: 0x4000 when the statement's character data is UTF-16
-    void* parent;           // the environment it was made from
-    void* object;           // the library's pointer; of an array of descriptors, the array
-    void* owner;            // bind, define: the statement
-    char* pool_name;        // spool, cpool: filled by the library
-    uint32_t pool_name_length;
-    char name[36];
-    unsigned char* area;    // key: 80 bytes of the slot's own
+    bool in_use = false;     // release clears this and nothing else
+    void* parent = nullptr;  // the environment it was made from
+    void* object = nullptr;  // the library's pointer; of an array of descriptors, the array
+    char name[36] = {};
 };
+struct NamedPool : NamedObject {
+    char* pool_name = nullptr;  // filled by the library
+    uint32_t pool_name_length = 0;
+};
+struct NamedStatement : NamedObject {
+    uint32_t utf16_mode = 0;  // 0x4000 when the statement's character data is UTF-16
+};
+struct NamedBind : NamedObject {  // a define, too
+    void* statement = nullptr;
+};
+struct NamedDescriptor : NamedObject {
+    uint32_t array_count = 0;  // elements of the array, 0 for a single descriptor
+};
+struct NamedLob : NamedDescriptor {
+    uint16_t type = 0;  // external, such as 112
+    uint32_t flag = 0;
+};
+struct NamedKey : NamedObject {
+    char text[80] = {};  // of its value. Taking the slot anew leaves it: the library may still hold its address
+};
+
+// The record of a kind. The kinds from `buffer` on have records and tables elsewhere.
+template <Kind kKind> struct RecordOfKind { using Type = NamedObject; };
+template <> struct RecordOfKind<Kind::spool> { using Type = NamedPool; };
+template <> struct RecordOfKind<Kind::cpool> { using Type = NamedPool; };
+template <> struct RecordOfKind<Kind::stmt> { using Type = NamedStatement; };
+template <> struct RecordOfKind<Kind::bind> { using Type = NamedBind; };
+template <> struct RecordOfKind<Kind::define> { using Type = NamedBind; };
+template <> struct RecordOfKind<Kind::lob> { using Type = NamedLob; };
+template <> struct RecordOfKind<Kind::result> { using Type = NamedDescriptor; };
+template <> struct RecordOfKind<Kind::rowid> { using Type = NamedDescriptor; };
+template <> struct RecordOfKind<Kind::file> { using Type = NamedDescriptor; };
+template <> struct RecordOfKind<Kind::datetime> { using Type = NamedDescriptor; };
+template <> struct RecordOfKind<Kind::key> { using Type = NamedKey; };
+template <Kind kKind> using RecordOf = typename RecordOfKind<kKind>::Type;
+
+// A slot of the kind as the kind's record; null stays null.
+template <Kind kKind> RecordOf<kKind>* AsRecord(NamedObject* slot) {
+    return static_cast<RecordOf<kKind>*>(slot);
+}
+// A slot of any kind as a descriptor; null where the kind is none.
+NamedDescriptor* AsDescriptor(Kind kind, NamedObject* slot);
+
+// All slots of a kind, free ones included, in their order.
+class Slots {
+public:
+    class Iterator {
+    public:
+        Iterator(NamedObject* slot, size_t stride) : slot_(slot), stride_(stride) {}
+        NamedObject& operator*() const { return *slot_; }
+        Iterator& operator++() {
+            slot_ = reinterpret_cast<NamedObject*>(reinterpret_cast<char*>(slot_) + stride_);
+            return *this;
+        }
+        bool operator!=(const Iterator& other) const { return slot_ != other.slot_; }
+
+    private:
+        NamedObject* slot_;
+        size_t stride_;
+    };
+
+    constexpr Slots() = default;
+    template <class Record, size_t kCount>
+    explicit constexpr Slots(Record (&slots)[kCount]) : first_(slots), count_(kCount), stride_(sizeof(Record)) {}
+    Iterator begin() const { return {first_, stride_}; }
+    Iterator end() const {
+        return {reinterpret_cast<NamedObject*>(reinterpret_cast<char*>(first_) + count_ * stride_), stride_};
+    }
+
+private:
+    NamedObject* first_ = nullptr;
+    size_t count_ = 0;
+    size_t stride_ = 0;
+};
+// None for kinds whose tables are elsewhere.
+Slots SlotsOf(Kind kind);
 
 // A deliberately bad object: a static, writable 15-byte text "Invalid buffer".
 void* InvalidObject();
@@ -75,8 +145,6 @@ bool FindObject(Kind kind, const char* name, void*& object);
 NamedObject* FindByName(Kind kind, const char* name);
 // The first occupied slot of that pointer, or null.
 NamedObject* FindByPointer(Kind kind, const void* object);
-// All slots of the kind, free ones included; none for kinds with records of their own.
-std::span<NamedObject> SlotsOf(Kind kind);
 
 // --- Making and freeing --------------------------------------------------------------------------------------------
 
@@ -97,7 +165,7 @@ void Release(Kind kind, const char* name);
 std::optional<Kind> KindOfHandleType(int type);
 std::optional<Kind> KindOfDescriptorType(int type);
 
-// --- For kinds with records of their own ---------------------------------------------------------------------------
+// --- For tables elsewhere ------------------------------------------------------------------------------------------
 // A record has at least `in_use` and a character array `name`.
 
 // Whether the slot's name is the word, cut to the slot's width.

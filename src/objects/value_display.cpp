@@ -1,4 +1,4 @@
-// One table from type to the function that shows an element of that type.
+// One table from type to the function that shows an element of that type. Command thread only.
 #include "objects/value_display.h"
 
 #include <algorithm>
@@ -10,7 +10,6 @@
 #include "core/state.h"
 #include "objects/decimal_float.h"
 #include "objects/element_access.h"
-#include "objects/library_failure.h"
 #include "objects/registry.h"
 #include "objects/text_conversion.h"
 #include "platform/client_library.h"
@@ -18,25 +17,23 @@
 
 namespace {
 
-// Ends the line of a value whose library call failed.
-void Fail(Line& line, sword rc) {
-    line.Print();
-    report_library_failure(DefaultErrorHandle, rc);
-}
+// Each of the functions below adds the value to the line, the line's end included, and answers OCI_SUCCESS or the
+// return code of the library call that failed, after which the line ends where it was.
 
-void EndLine(Line& line) {
-    line.Character('\n').Print();
+sword End(Line& line) {
+    line.Character('\n');
+    return OCI_SUCCESS;
 }
 
 // --- Texts and bytes -----------------------------------------------------------------------------------------------
 
-void ShowText(Line& line, std::string_view text, bool utf16) {
-    if (AddText(line, text.data(), text.size(), utf16, Quotes::always)) EndLine(line);
+sword ShowText(Line& line, std::string_view text, bool utf16) {
+    return AddText(line, text.data(), text.size(), utf16, Quotes::always) ? End(line) : OCI_SUCCESS;
 }
 
-void ShowBytes(Line& line, std::string_view bytes) {
+sword ShowBytes(Line& line, std::string_view bytes) {
     line.Character('"').Hex(bytes.data(), bytes.size()).Character('"');
-    EndLine(line);
+    return End(line);
 }
 
 // What the element's length says it holds.
@@ -52,68 +49,72 @@ template <class Prefix> std::string_view Prefixed(const ElementView& element) {
     return {reinterpret_cast<const char*>(element.data) + sizeof(Prefix), static_cast<size_t>(length)};
 }
 
-void ShowCharacters(Line& line, const ElementView& element) {
-    ShowText(line, Counted(element), element.utf16);
+sword ShowCharacters(Line& line, const ElementView& element) {
+    return ShowText(line, Counted(element), element.utf16);
 }
 
-void ShowTerminated(Line& line, const ElementView& element) {
+sword ShowTerminated(Line& line, const ElementView& element) {
     const auto* text = reinterpret_cast<const char*>(element.data);
     const size_t length = element.utf16 ? Utf16Length(text, element.size) : strnlen(text, element.size);
-    ShowText(line, {text, length}, element.utf16);
+    return ShowText(line, {text, length}, element.utf16);
 }
 
-template <class Prefix> void ShowPrefixedText(Line& line, const ElementView& element) {
-    ShowText(line, Prefixed<Prefix>(element), element.utf16);
+template <class Prefix> sword ShowPrefixedText(Line& line, const ElementView& element) {
+    return ShowText(line, Prefixed<Prefix>(element), element.utf16);
 }
 
-void ShowLibraryString(Line& line, const ElementView& element) {
+sword ShowLibraryString(Line& line, const ElementView& element) {
     const auto* string = ReadElement<OCIString*>(element.data, element.size);
     const OraText* text = Call(&ClientLibrary::OCIStringPtr, DefaultEnvironment, string);
     const ub4 length = text == nullptr ? 0 : Call(&ClientLibrary::OCIStringSize, DefaultEnvironment, string);
-    ShowText(line, {reinterpret_cast<const char*>(text), length}, element.utf16);
+    return ShowText(line, {reinterpret_cast<const char*>(text), length}, element.utf16);
 }
 
-void ShowCountedBytes(Line& line, const ElementView& element) {
-    ShowBytes(line, Counted(element));
+sword ShowCountedBytes(Line& line, const ElementView& element) {
+    return ShowBytes(line, Counted(element));
 }
 
-void ShowPrefixedBytes(Line& line, const ElementView& element) {
-    ShowBytes(line, Prefixed<uint16_t>(element));
+sword ShowPrefixedBytes(Line& line, const ElementView& element) {
+    return ShowBytes(line, Prefixed<uint16_t>(element));
 }
 
-void ShowLibraryRaw(Line& line, const ElementView& element) {
+sword ShowLibraryRaw(Line& line, const ElementView& element) {
     const auto* raw = ReadElement<OCIRaw*>(element.data, element.size);
     const ub1* bytes = Call(&ClientLibrary::OCIRawPtr, DefaultEnvironment, raw);
     const ub4 length = bytes == nullptr ? 0 : Call(&ClientLibrary::OCIRawSize, DefaultEnvironment, raw);
-    ShowBytes(line, {reinterpret_cast<const char*>(bytes), length});
+    return ShowBytes(line, {reinterpret_cast<const char*>(bytes), length});
 }
 
 // --- Numbers -------------------------------------------------------------------------------------------------------
 
-void ShowNumber(Line& line, const ElementView& element) {
+sword ShowNumber(Line& line, const ElementView& element) {
     const auto number = ReadElement<OCINumber>(element.data, element.size);
     double value = 0;
     const sword rc = Call(&ClientLibrary::OCINumberToReal, DefaultErrorHandle, &number, uword{sizeof value}, &value);
-    if (rc != OCI_SUCCESS) return Fail(line, rc);
-    line.Format("%f\n", value).Print();
+    if (rc != OCI_SUCCESS) return rc;
+    line.Format("%f", value);
+    return End(line);
 }
 
-void ShowSigned(Line& line, const ElementView& element) {
-    line.Format("%lld\n", static_cast<long long>(ReadSigned(element.data, element.size))).Print();
+sword ShowSigned(Line& line, const ElementView& element) {
+    line.Format("%lld", static_cast<long long>(ReadSigned(element.data, element.size)));
+    return End(line);
 }
 
-void ShowUnsigned(Line& line, const ElementView& element) {
-    line.Format("%llu\n", static_cast<unsigned long long>(ReadUnsigned(element.data, element.size))).Print();
+sword ShowUnsigned(Line& line, const ElementView& element) {
+    line.Format("%llu", static_cast<unsigned long long>(ReadUnsigned(element.data, element.size)));
+    return End(line);
 }
 
-void ShowReal(Line& line, const ElementView& element) {
+sword ShowReal(Line& line, const ElementView& element) {
     double value = 0;
     if (element.size == 4) value = ReadElement<float>(element.data, element.size);
     if (element.size == 8 || element.size == 16) value = ReadElement<double>(element.data, element.size);
-    line.Format("%f\n", value).Print();
+    line.Format("%f", value);
+    return End(line);
 }
 
-void ShowPackedDecimal(Line& line, const ElementView& element) {
+sword ShowPackedDecimal(Line& line, const ElementView& element) {
     constexpr size_t kSignPointAndEnd = 4;
     const int digits = std::max<int>(element.precision, std::abs(element.scale));
     std::string text(kSignPointAndEnd + static_cast<size_t>(digits), '\0');
@@ -126,45 +127,43 @@ void ShowPackedDecimal(Line& line, const ElementView& element) {
         Message(kError, "DecimalToText failed with rc - %ld\n", static_cast<long>(rc));
     }
     line.Text(text.c_str());
-    EndLine(line);
+    return End(line);
 }
 
-void ShowDecimalFloat(Line& line, const ElementView& element) {
+sword ShowDecimalFloat(Line& line, const ElementView& element) {
     line.Print();  // the statement that converts may run callbacks which print
     std::string text;
     const sword rc = DecimalFloatText(element.type, element.data, element.size, text);
-    if (rc != OCI_SUCCESS) return Fail(line, rc);
+    if (rc != OCI_SUCCESS) return rc;
     line.Text(text);
-    EndLine(line);
+    return End(line);
 }
 
 // --- Dates ---------------------------------------------------------------------------------------------------------
 
-void ShowSevenByteDate(Line& line, const ElementView& element) {
+sword ShowSevenByteDate(Line& line, const ElementView& element) {
     SevenByteDate date;
-    if (!date.Read(element.data, element.size)) return static_cast<void>(line.Text("Invalid date found\n").Print());
-    line.Format("\"%04d-%02d-%02d-%02d:%02d:%02d\"\n", date.year, date.month, date.day, date.hour, date.minute,
+    if (!date.Read(element.data, element.size)) return End(line.Text("Invalid date found"));
+    line.Format("\"%04d-%02d-%02d-%02d:%02d:%02d\"", date.year, date.month, date.day, date.hour, date.minute,
                 date.second);
-    line.Print();
+    return End(line);
 }
 
-void AddDate(Line& line, const OCIDate& date) {
+sword AddDate(Line& line, const OCIDate& date) {
     const OCITime& time = date.OCIDateTime;
     line.Format("%04d-%02d-%02d-%02d:%02d:%02d\n", date.OCIDateYYYY, date.OCIDateMM, date.OCIDateDD, time.OCITimeHH,
                 time.OCITimeMI, time.OCITimeSS);
-    line.Print();
     constexpr int kLastSecond = 60;  // a leap second is accepted
-    if (time.OCITimeSS > kLastSecond)
-        Message(kOutput, "Invalid OCITimeSS - %ld\n", static_cast<long>(time.OCITimeSS));
+    if (time.OCITimeSS > kLastSecond) line.Format("Invalid OCITimeSS - %d\n", time.OCITimeSS);
+    return OCI_SUCCESS;
 }
 
-void ShowDate(Line& line, const ElementView& element) {
-    AddDate(line, ReadElement<OCIDate>(element.data, element.size));
+sword ShowDate(Line& line, const ElementView& element) {
+    return AddDate(line, ReadElement<OCIDate>(element.data, element.size));
 }
 
-// Adds the datetime as the library reads it, with `quote` around, and ends the line; a failing read is reported
-// instead.
-void AddDateTime(Line& line, OCIDateTime* datetime, const char* quote) {
+// The datetime as the library reads it, with `quote` around.
+sword AddDateTime(Line& line, OCIDateTime* datetime, const char* quote) {
     sb2 year = 0;
     ub1 month = 0, day = 0, hour = 0, minute = 0, second = 0;
     ub4 fraction = 0;
@@ -173,35 +172,37 @@ void AddDateTime(Line& line, OCIDateTime* datetime, const char* quote) {
     if (rc == OCI_SUCCESS)
         rc = Call(&ClientLibrary::OCIDateTimeGetTimeNS, DefaultEnvironment, DefaultErrorHandle, datetime, &hour,
                   &minute, &second, &fraction);
-    if (rc != OCI_SUCCESS) return Fail(line, rc);
-    line.Format("%s%04d-%02d-%02d %02d:%02d:%02d.%06d%s\n", quote, year, month, day, hour, minute, second,
+    if (rc != OCI_SUCCESS) return rc;
+    line.Format("%s%04d-%02d-%02d %02d:%02d:%02d.%06d%s", quote, year, month, day, hour, minute, second,
                 static_cast<int>(fraction), quote);
-    line.Print();
+    return End(line);
 }
 
-void ShowDateTime(Line& line, const ElementView& element) {
-    AddDateTime(line, ReadElement<OCIDateTime*>(element.data, element.size), "\"");
+sword ShowDateTime(Line& line, const ElementView& element) {
+    return AddDateTime(line, ReadElement<OCIDateTime*>(element.data, element.size), "\"");
 }
 
 // --- Handles -------------------------------------------------------------------------------------------------------
 
-void ShowHandle(Line& line, const ElementView& element) {
+sword ShowHandle(Line& line, const ElementView& element) {
     const bool null = ReadElement<void*>(element.data, element.size) == nullptr;
-    line.Text(null ? "Null value\n" : "Non null value\n").Print();
+    return End(line.Text(null ? "Null value" : "Non null value"));
 }
 
-void ShowRowid(Line& line, const ElementView&) {
-    line.Text("RID\n").Print();
+sword ShowRowid(Line& line, const ElementView&) {
+    return End(line.Text("RID"));
 }
 
 // Locators are shown by the LOB commands only.
-void ShowLocator(Line& line, const ElementView&) {
-    EndLine(line);
+sword ShowLocator(Line& line, const ElementView&) {
+    return End(line);
 }
+
+using Show = sword (*)(Line& line, const ElementView& element);
 
 struct TypeDisplay {
     int type;
-    void (*show)(Line& line, const ElementView& element);
+    Show show;
 };
 
 constexpr TypeDisplay kTypeDisplays[] = {
@@ -241,65 +242,66 @@ constexpr TypeDisplay kTypeDisplays[] = {
 
 // One step from a type to its display.
 struct DisplayIndex {
-    void (*show[SQLT_TIMESTAMP_LTZ + 1])(Line&, const ElementView&) = {};
+    Show shows[SQLT_TIMESTAMP_LTZ + 1] = {};
     constexpr DisplayIndex() {
-        for (const TypeDisplay& row : kTypeDisplays) show[row.type] = row.show;
+        for (const TypeDisplay& row : kTypeDisplays) shows[row.type] = row.show;
     }
+    // Null where a type has no display.
+    Show Find(int type) const { return type < 0 || type > SQLT_TIMESTAMP_LTZ ? nullptr : shows[type]; }
 };
 constexpr DisplayIndex kDisplayIndex;
 
-uint32_t ElementLength(const MemBuffer& buffer, uint32_t index) {
-    if (buffer.dynamic_lengths == 0) return buffer.lengths[index];
-    const uint32_t previous = buffer.previous_lengths == nullptr ? 0 : buffer.previous_lengths[index];
-    return previous + (buffer.piece_lengths == nullptr ? 0 : buffer.piece_lengths[index]);
+uint32_t LengthOf(const MemBuffer& buffer, uint32_t index) {
+    const DynamicData& dynamic = buffer.dynamic;
+    if (dynamic.lengths_count == 0) return buffer.lengths[index];
+    const uint32_t previous = dynamic.previous_lengths == nullptr ? 0 : dynamic.previous_lengths[index];
+    return previous + (dynamic.piece_lengths == nullptr ? 0 : dynamic.piece_lengths[index]);
+}
+
+bool HasValue(const ElementView& element) {
+    constexpr int kNullIndicator = -1;
+    return element.indicator != kNullIndicator && (element.return_code == 0 || element.return_code == 1);
+}
+
+// Prints what the line has left.
+sword Printed(Line& line, sword rc) {
+    if (!line.Empty()) line.Print();
+    return rc;
 }
 
 }  // namespace
 
-void DisplayElement(Line& line, const ElementView& element) {
-    constexpr int kNullIndicator = -1;
-    if (element.indicator == kNullIndicator || (element.return_code != 0 && element.return_code != 1)) {
-        EndLine(line);
-        return;
-    }
-    if (element.type <= 0 || element.type > SQLT_TIMESTAMP_LTZ || kDisplayIndex.show[element.type] == nullptr) {
-        line.Print();  // the line of a type that has no display is not ended either
-        return;
-    }
-    kDisplayIndex.show[element.type](line, element);
+sword DisplayElement(Line& line, const ElementView& element) {
+    if (!HasValue(element)) return Printed(line, End(line));
+    const Show show = kDisplayIndex.Find(element.type);
+    return Printed(line, show == nullptr ? OCI_SUCCESS : show(line, element));
 }
 
-void DisplayBuffer(Line& line, const MemBuffer& buffer) {
-    const bool utf16 = StatementIsUtf16(buffer.statement);
-    for (uint32_t index = 0; buffer.Complete() && index < buffer.array_size; ++index) {
-        const ElementView element = {.type = buffer.type,
-                                     .data = buffer.Element(index),
-                                     .size = buffer.element_size,
-                                     .indicator = buffer.indicators[index],
-                                     .return_code = buffer.return_codes[index],
-                                     .length = ElementLength(buffer, index),
-                                     .precision = buffer.precision,
-                                     .scale = buffer.scale,
-                                     .utf16 = utf16};
-        line.Format("Row=%u,Ind=%d,rcode=%d,len=%u,data=", index + 1, element.indicator, element.return_code,
-                    element.length);
-        DisplayElement(line, element);
-    }
-    if (!line.Empty()) line.Print();
+ElementView ElementOf(const MemBuffer& buffer, uint32_t index, bool utf16) {
+    return {.type = buffer.type,
+            .data = buffer.Element(index),
+            .size = buffer.element_size,
+            .indicator = buffer.indicators[index],
+            .return_code = buffer.return_codes[index],
+            .length = LengthOf(buffer, index),
+            .precision = buffer.precision,
+            .scale = buffer.scale,
+            .utf16 = utf16};
 }
 
 bool StatementIsUtf16(const void* statement) {
     if (statement == nullptr) return false;
-    const NamedObject* slot = FindByPointer(Kind::stmt, statement);
-    return slot != nullptr && slot->utf16_mode != 0;
+    NamedObject* const slot = FindByPointer(Kind::stmt, statement);
+    return slot != nullptr && AsRecord<Kind::stmt>(slot)->utf16_mode != 0;
 }
 
 void PrintDate(const OCIDate& date) {
     Line line;
     AddDate(line, date);
+    line.Print();
 }
 
-void PrintDateTime(OCIDateTime* datetime) {
+sword PrintDateTime(OCIDateTime* datetime) {
     Line line;
-    AddDateTime(line, datetime, "");
+    return Printed(line, AddDateTime(line, datetime, ""));
 }

@@ -21,18 +21,19 @@ struct ElementView {
     bool utf16;                // its statement's character data is UTF-16
 };
 
-// Ends the line, which holds the element's prefix, with the value if one follows, and prints it.
-void DisplayElement(Line& line, const ElementView& element);
+// Ends the line, which holds the element's prefix, with the value if one follows, and prints it. Answers the return
+// code of the library call that failed, for the caller to report; the line ends where it was, then. The line of a type
+// that has no display is not ended either.
+sword DisplayElement(Line& line, const ElementView& element);
 
-// All elements of a buffer, "Row=%ld,Ind=%ld,rcode=%ld,len=%ld,data=" before each. What the line already holds stands
-// before the first.
-void DisplayBuffer(Line& line, const MemBuffer& buffer);
+// An element of a complete buffer. `utf16`: see StatementIsUtf16.
+ElementView ElementOf(const MemBuffer& buffer, uint32_t index, bool utf16);
 
 // Whether the statement's character data is UTF-16, by its registry slot.
 bool StatementIsUtf16(const void* statement);
 
 // A date as "%04ld-%02ld-%02ld-%02ld:%02ld:%02ld\n"; a second above 60 adds "Invalid OCITimeSS - %ld\n".
 void PrintDate(const OCIDate& date);
-// A datetime as "%04ld-%02ld-%02ld %02ld:%02ld:%02ld.%06ld\n", read with the default environment and error handle; a
-// failing read is reported instead.
-void PrintDateTime(OCIDateTime* datetime);
+// A datetime as "%04ld-%02ld-%02ld %02ld:%02ld:%02ld.%06ld\n", read with the default environment and error handle. When
+// that fails nothing is printed, and the return code is for the caller to report.
+sword PrintDateTime(OCIDateTime* datetime);

@@ -14,14 +14,13 @@
 
 #include "core/command_table.h"
 #include "core/messages.h"
-#include "core/script.h"
+#include "loop/script.h"
 #include "core/state.h"
 #include "objects/buffers.h"
 #include "objects/registry.h"
 
 namespace {
 
-constexpr int kPauseCode = 406;
 
 // Once: away with the output, and into a directory that a script may fill and empty.
 void Prepare() {
@@ -44,7 +43,7 @@ bool Pauses(const std::string& script) {
         std::string word;
         if (!(words >> word)) continue;
         const Command* command = FindCommand(word.c_str());
-        if (command != nullptr && command->code == kPauseCode) return true;
+        if (command != nullptr && command->code == Code::pause) return true;
     }
     return false;
 }

@@ -127,7 +127,7 @@ TEST(Registry, ReservedWordsAreNoNames) {
 
 TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
     void* array[] = {&object_a, &object_b};
-    Register(Kind::lob, "arr", array, nullptr)->array_count = 2;
+    AsRecord<Kind::lob>(Register(Kind::lob, "arr", array, nullptr))->array_count = 2;
     Register(Kind::lob, "one", &object_b, nullptr);
     const struct {
         const char* word;

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "core/tokenizer.h"
+#include "loop/tokenizer.h"
 #include "support/printed.h"
 
 namespace {

@@ -6,7 +6,7 @@
 #include <sstream>
 #include <string>
 
-#include "core/dispatch.h"
+#include "loop/dispatch.h"
 
 namespace {
 
@@ -50,7 +50,7 @@ TEST(ValueCommands, UsageTextsPromiseTheWordCountsTaken) {
     int commands = 0;
     for (const auto& range : ranges) {
         for (int code = range.first; code <= range.last; ++code) {
-            const HandlerTable::Handler* const handler = Handlers().Find(code);
+            const HandlerTable::Handler* const handler = Handlers().Find(static_cast<Code>(code));
             ASSERT_NE(handler, nullptr) << code;
             const CommandRow& row = *handler->row;
             const auto exception = exceptions.find(code);
