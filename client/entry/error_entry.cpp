@@ -4,6 +4,7 @@
 
 #include "handles/gate.h"
 #include "oci.h"
+#include "platform/utf.h"
 
 namespace {
 
@@ -19,9 +20,7 @@ std::string Message(const Environment& environment, const ErrorList::Record& rec
     const std::size_t longest = OCI_ERROR_MAXMSG_SIZE / (environment.Utf16() ? 2 : 1) - 1;
     std::string message = ErrorMessage(record.number, record.engine, record.detail);
     if (message.size() <= longest) return message;
-    std::size_t end = longest - 1;
-    while (end > 0 && (static_cast<unsigned char>(message[end]) & 0xC0) == 0x80) --end;
-    message.resize(end);
+    message.resize(utf::WholeUtf8(message, longest - 1));
     return message += '\n';
 }
 

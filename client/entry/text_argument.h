@@ -10,6 +10,7 @@
 
 #include "handles/environment.h"
 #include "oci.h"
+#include "platform/utf.h"
 
 class TextArgument {
 public:

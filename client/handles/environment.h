@@ -98,9 +98,3 @@ bool TextToBuffer(const Environment& environment, std::string_view utf8, void* b
 
 // The bytes of a zero-terminated text of the application's.
 std::size_t TextLength(const Environment& environment, const void* text);
-
-namespace utf {
-// Between UTF-8 and UTF-16 in native order. False: malformed input; what came before it is in `out`.
-bool ToUtf8(const void* utf16, std::size_t bytes, std::string& out);
-bool ToUtf16(std::string_view utf8, std::string& out);    // bytes of the units
-}  // namespace utf

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "handles/errors.h"
+#include "platform/utf.h"
 #include "sessions/link.h"
 #include "statements/statement.h"
 
@@ -26,14 +27,8 @@ bool IsNull(const PieceBuffer& piece) {
 
 // How many bytes of `rest` a buffer takes without tearing a character apart.
 std::size_t PieceLength(const Define& define, std::string_view rest, std::size_t room) {
-    if (rest.size() <= room) return rest.size();
-    if (define.Type()->family != values::Family::text) return room;
-    if (define.workspace.utf16) {
-        room = room / 2 * 2;
-        return room > 0 && (static_cast<unsigned char>(rest[room - 1]) & 0xFC) == 0xD8 ? room - 2 : room;
-    }
-    while (room > 0 && (static_cast<unsigned char>(rest[room]) & 0xC0) == 0x80) --room;
-    return room;
+    if (define.Type()->family != values::Family::text) return std::min(rest.size(), room);
+    return define.workspace.utf16 ? utf::WholeUtf16(rest, room) : utf::WholeUtf8(rest, room);
 }
 
 // A null, into the application's places for it.

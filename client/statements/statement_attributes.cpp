@@ -2,6 +2,7 @@
 #include "handles/attributes.h"
 #include "handles/environment.h"
 #include "handles/errors.h"
+#include "platform/utf.h"
 #include "statements/statement.h"
 #include "values/rowid_descriptor.h"
 

@@ -9,6 +9,7 @@
 #include "number/decimal_float.h"
 #include "number/number.h"
 #include "oci.h"
+#include "platform/utf.h"
 #include "values/in_rows.h"
 #include "values/packed_decimal.h"
 #include "values/rowid.h"

@@ -11,6 +11,7 @@
 #include "handles/errors.h"
 #include "number/number.h"
 #include "oci.h"
+#include "platform/utf.h"
 #include "values/out_rows.h"
 #include "values/rowid.h"
 
@@ -202,22 +203,9 @@ int BytesOfHex(const Datum& datum, Workspace& workspace, View& bytes) {
 
 // ---- How character data is laid into elements
 
-std::size_t WholeCharacters(View text, std::size_t room) {
-    if (text.size() <= room) return text.size();
-    while (room > 0 && (static_cast<unsigned char>(text[room]) & 0xC0) == 0x80) --room;
-    return room;
-}
-
-std::size_t WholeUnits(View units, std::size_t room) {
-    if (units.size() <= room) return units.size();
-    room = room / 2 * 2;
-    const bool torn_pair = room > 0 && (static_cast<unsigned char>(units[room - 1]) & 0xFC) == 0xD8;
-    return torn_pair ? room - 2 : room;
-}
-
 // Copies as much as `room` takes; answers the bytes copied.
 std::size_t CopyCut(View text, const Workspace& workspace, char* at, std::size_t room, Target& target) {
-    const std::size_t stored = workspace.utf16 ? WholeUnits(text, room) : WholeCharacters(text, room);
+    const std::size_t stored = workspace.utf16 ? utf::WholeUtf16(text, room) : utf::WholeUtf8(text, room);
     if (stored > 0) std::memcpy(at, text.data(), stored);
     target.stored = static_cast<std::uint32_t>(stored);
     target.whole = text.size();
@@ -279,7 +267,7 @@ int PutPrefixed(View utf8, Workspace& workspace, Target& target) {
     View text;
     if (const int error = ToApplication(utf8, workspace, text)) return error;
     const std::size_t room = PrefixedRoom<Prefix>(target);
-    return LayPrefixed<Prefix>(text, workspace.utf16 ? WholeUnits(text, room) : WholeCharacters(text, room), target);
+    return LayPrefixed<Prefix>(text, workspace.utf16 ? utf::WholeUtf16(text, room) : utf::WholeUtf8(text, room), target);
 }
 
 // ---- How bytes are

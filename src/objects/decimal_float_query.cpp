@@ -1,5 +1,5 @@
 // Decimal floats into texts: one statement that casts the bound value, run on the server.
-#include "objects/decimal_float.h"
+#include "objects/decimal_float_query.h"
 
 #include <algorithm>
 #include <cstring>
@@ -9,6 +9,7 @@
 #include "objects/text_conversion.h"
 #include "oci.h"
 #include "platform/client_library.h"
+#include "platform/utf.h"
 
 namespace {
 
@@ -67,7 +68,7 @@ int DecimalFloatText(int type, const unsigned char* data, uint32_t size, std::st
         rc = Call(&ClientLibrary::OCIStmtExecute, AnyServiceContext(), statement, DefaultErrorHandle, ub4{1}, ub4{0},
                   nullptr, nullptr, ub4{OCI_DEFAULT});
     if (rc == OCI_SUCCESS) {
-        if (Utf16Mode) convertFromUTF16(result, Utf16Length(result, result_size), text);
+        if (Utf16Mode) convertFromUTF16(result, utf::Utf16Length(result, result_size), text);
         else text.assign(result);
     }
     Call(&ClientLibrary::OCIHandleFree, statement, ub4{OCI_HTYPE_STMT});

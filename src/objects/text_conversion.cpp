@@ -91,13 +91,6 @@ bool convertFromUTF16(const void* text, size_t length, std::string& output) {
     return false;
 }
 
-size_t Utf16Length(const void* text, size_t limit) {
-    const auto* bytes = static_cast<const char*>(text);
-    size_t length = 0;
-    while (length + 1 < limit && (bytes[length] != 0 || bytes[length + 1] != 0)) length += 2;
-    return length;
-}
-
 bool AddText(Line& line, const void* text, size_t length, bool utf16, Quotes quotes) {
     if (!utf16) {
         const std::string_view mark = quotes == Quotes::always ? "\"" : "";

@@ -20,9 +20,6 @@ bool IsTolerated(int result);
 // A UTF-16 text of the library as the application code page shows it. False after a failure, which has been printed.
 bool convertFromUTF16(const void* text, size_t length, std::string& output);
 
-// The bytes of a UTF-16 text before its first zero pair, looking no further than `limit` bytes.
-size_t Utf16Length(const void* text, size_t limit);
-
 // Adds a text of the library to a line, converted when `utf16`. After a failed conversion the line is printed as far as
 // it goes, the failure after it, and false returned.
 enum class Quotes {

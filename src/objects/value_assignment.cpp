@@ -12,13 +12,13 @@
 #include "core/keywords.h"
 #include "core/messages.h"
 #include "core/state.h"
-#include "objects/decimal_float.h"
 #include "objects/element_access.h"
 #include "objects/library_number.h"
 #include "objects/registry.h"
 #include "objects/text_conversion.h"
 #include "oci.h"
 #include "platform/client_library.h"
+#include "platform/decimal_float.h"
 #include "platform/packed_decimal.h"
 
 namespace {
@@ -189,7 +189,7 @@ Stored AssignPackedDecimal(const ElementTarget& target, const Value& value) {
 
 template <uint32_t kSize> Stored AssignDecimalFloat(const ElementTarget& target, const Value& value) {
     unsigned char bytes[kSize];
-    if (!DecimalFloatFromText(value.word, kSize, bytes)) return std::nullopt;
+    if (!decimal_float::FromText(value.word, kSize, bytes)) return std::nullopt;
     return Copy(target, 0, {reinterpret_cast<const char*>(bytes), kSize}, target.size);
 }
 

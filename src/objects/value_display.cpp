@@ -8,12 +8,13 @@
 #include <string_view>
 
 #include "core/state.h"
-#include "objects/decimal_float.h"
+#include "objects/decimal_float_query.h"
 #include "objects/element_access.h"
 #include "objects/registry.h"
 #include "objects/text_conversion.h"
 #include "platform/client_library.h"
 #include "platform/packed_decimal.h"
+#include "platform/utf.h"
 
 namespace {
 
@@ -55,7 +56,7 @@ sword ShowCharacters(Line& line, const ElementView& element) {
 
 sword ShowTerminated(Line& line, const ElementView& element) {
     const auto* text = reinterpret_cast<const char*>(element.data);
-    const size_t length = element.utf16 ? Utf16Length(text, element.size) : strnlen(text, element.size);
+    const size_t length = element.utf16 ? utf::Utf16Length(text, element.size) : strnlen(text, element.size);
     return ShowText(line, {text, length}, element.utf16);
 }
 

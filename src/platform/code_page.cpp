@@ -15,9 +15,11 @@
 #include <vector>
 
 #include "platform/code_page_table.h"
-#include "platform/utf_conversion.h"
+#include "platform/utf.h"
 
 namespace {
+
+using utf::Conversion;
 
 class Converter {
 public:
@@ -156,9 +158,9 @@ int Convert(std::uint32_t source, std::uint32_t target, Conversion& conversion) 
     const CodePage* const to = FindCodePage(target);
     if (!from || !to) return kCodePageUnknown;
     if (source == kCodePageUtf8 && target == kCodePageUtf16) {
-        ConvertUtf8ToUtf16(conversion);
+        utf::ConvertUtf8ToUtf16(conversion);
     } else if (source == kCodePageUtf16 && target == kCodePageUtf8) {
-        ConvertUtf16ToUtf8(conversion);
+        utf::ConvertUtf16ToUtf8(conversion);
     } else {
         PagePair& pair = Pair(*from, *to);
         if (!pair.IsOpen()) return kCodePageFailed;

@@ -1,4 +1,4 @@
-// Packed decimal to and from text.
+// Packed decimal to and from digits and texts. Any thread.
 #include "platform/packed_decimal.h"
 
 #include <algorithm>
@@ -106,20 +106,52 @@ std::string Rounded(const std::string& digits, std::int64_t count) {
     return kept;
 }
 
+// Whether the closing half byte is a sign, and which.
+bool ReadSign(const unsigned char* packed, std::size_t size, bool& negative) {
+    const int sign = packed[size - 1] & 0xF;
+    negative = sign == kMinus || sign == 0xB;
+    return sign >= 0xA;
+}
+
 }  // namespace
+
+int ReadPackedDecimal(const void* packed, std::size_t size, bool* negative, char* digits, std::size_t room,
+                      std::size_t* count) {
+    const auto* const bytes = static_cast<const unsigned char*>(packed);
+    *count = 0;
+    if (!ReadSign(bytes, size, *negative)) return kDecimalBadSign;
+    for (std::size_t half = 0; half < 2 * size - 1; ++half) {
+        const int digit = Half(bytes, half);
+        if (digit > 9) return kDecimalBadDigit;
+        if (digit == 0 && *count == 0) continue;
+        if (*count == room) return kDecimalTooShort;
+        digits[(*count)++] = static_cast<char>('0' + digit);
+    }
+    return kDecimalDone;
+}
+
+void WritePackedDecimal(std::string_view digits, bool negative, void* packed, std::size_t size) {
+    auto* const bytes = static_cast<unsigned char*>(packed);
+    std::fill_n(bytes, size, static_cast<unsigned char>(0));
+    bytes[size - 1] = static_cast<unsigned char>(negative ? kMinus : kPlus);
+    for (std::size_t half = 1; !digits.empty(); ++half, digits.remove_suffix(1)) {
+        unsigned char& byte = bytes[size - 1 - half / 2];
+        byte = static_cast<unsigned char>(byte | (digits.back() - '0') << (half % 2 * 4));
+    }
+}
 
 int DecimalToText(const unsigned char* packed, std::uint32_t precision, std::int32_t scale, char* text,
                   std::size_t capacity) {
     Writer writer(text, capacity);
     const std::size_t count = 2 * PackedDecimalSize(precision) - 1;    // digits, an unused leading one included
-    const int sign = Half(packed, count);
-    if (sign < 0xA) return kDecimalBadSign;
+    bool negative = false;
+    if (!ReadSign(packed, PackedDecimalSize(precision), negative)) return kDecimalBadSign;
 
     const auto end = static_cast<std::int64_t>(count);
     const std::int64_t point = end - scale;    // index of the first digit behind the point; may lie outside
     bool zero = true;
     for (std::size_t index = 0; index < count; ++index) zero = zero && Half(packed, index) == 0;
-    if ((sign == 0xD || sign == 0xB) && !zero) writer.Put('-');
+    if (negative && !zero) writer.Put('-');
 
     const std::int64_t first = zero ? point - 1 : std::min<std::int64_t>(0, point - 1);
     bool started = false;
@@ -143,16 +175,7 @@ int TextToDecimal(const char* text, unsigned char* packed, std::uint32_t precisi
     const std::string digits = Rounded(decimal.digits, count);
     if (digits.size() > precision) return kDecimalOverflow;
 
-    const std::size_t size = PackedDecimalSize(precision);
-    const std::size_t halves = 2 * size;
-    const std::size_t first = halves - 1 - digits.size();
-    std::fill_n(packed, size, static_cast<unsigned char>(0));
-    for (std::size_t index = 0; index < digits.size(); ++index) {
-        const std::size_t half = first + index;
-        const int digit = digits[index] - '0';
-        packed[half / 2] = static_cast<unsigned char>(packed[half / 2] | (half % 2 == 0 ? digit << 4 : digit));
-    }
     const bool negative = decimal.negative && digits.find_first_not_of('0') != std::string::npos;
-    packed[size - 1] = static_cast<unsigned char>(packed[size - 1] | (negative ? kMinus : kPlus));
+    WritePackedDecimal(digits, negative, packed, PackedDecimalSize(precision));
     return kDecimalDone;
 }

@@ -5,6 +5,7 @@
 
 #include "core/state.h"
 #include "objects/text_conversion.h"
+#include "platform/utf.h"
 
 namespace {
 
@@ -49,7 +50,7 @@ bool ReadDiagnostic(const char* room, size_t room_size, std::string& text) {
     if (!Utf16Mode) {
         text.assign(room, strnlen(room, room_size));
     } else {
-        if (!convertFromUTF16(room, Utf16Length(room, room_size), text)) return false;
+        if (!convertFromUTF16(room, utf::Utf16Length(room, room_size), text)) return false;
         if (text.size() > kLongestText) text.resize(kLongestText);
     }
     text = NormaliseDiagnostic(std::move(text));

@@ -8,6 +8,7 @@
 #include "core/messages.h"
 #include "core/state.h"
 #include "objects/text_conversion.h"
+#include "platform/utf.h"
 
 namespace {
 
@@ -147,7 +148,7 @@ void ShowServerVersion(const CommandRow& row, int count, char** words) {
                           static_cast<ub1>(type));
     TraceAndReport(row.code, words[1], error, rc);
     if (text == nullptr || (rc != OCI_SUCCESS && rc != OCI_SUCCESS_WITH_INFO)) return;
-    const size_t shown = Utf16Mode ? Utf16Length(text, room.size())
+    const size_t shown = Utf16Mode ? utf::Utf16Length(text, room.size())
                                    : strnlen(reinterpret_cast<const char*>(text), room.size());
     Line line;
     if (AddText(line, text, shown, Utf16Mode)) line.Character('\n').Print();

@@ -12,6 +12,7 @@
 #include "objects/memory.h"
 #include "objects/text_conversion.h"
 #include "platform/client_library.h"
+#include "platform/utf.h"
 #include "report/return_code.h"
 
 namespace {
@@ -168,7 +169,7 @@ bool Table::ReceivePiece() {
 
 void Table::TakePiece() {
     const char* const text = buffer_.get();
-    if (Utf16Mode) value_.append(text, Utf16Length(text, length_));
+    if (Utf16Mode) value_.append(text, utf::Utf16Length(text, length_));
     else line_.Text({text, strnlen(text, length_)});
 }
 

@@ -6,6 +6,7 @@
 
 #include "core/state.h"
 #include "objects/text_conversion.h"
+#include "platform/utf.h"
 #include "support/printed.h"
 
 namespace {
@@ -99,10 +100,10 @@ TEST_F(Texts, ConvertFromUtf16) {
 
 TEST_F(Texts, Utf16TextsEndAtTheFirstZeroPair) {
     const std::string text = Wide("ab") + std::string(2, '\0') + Wide("c");
-    EXPECT_EQ(Utf16Length(text.data(), text.size()), 4u);
-    EXPECT_EQ(Utf16Length(text.data(), 3), 2u);
-    EXPECT_EQ(Utf16Length("\0\1\0\0", 4), 2u) << "a zero byte alone ends nothing";
-    EXPECT_EQ(Utf16Length(text.data(), 0), 0u);
+    EXPECT_EQ(utf::Utf16Length(text.data(), text.size()), 4u);
+    EXPECT_EQ(utf::Utf16Length(text.data(), 3), 2u);
+    EXPECT_EQ(utf::Utf16Length("\0\1\0\0", 4), 2u) << "a zero byte alone ends nothing";
+    EXPECT_EQ(utf::Utf16Length(text.data(), 0), 0u);
 }
 
 TEST_F(Texts, ArgumentsAsTheyAreTyped) {

@@ -8,7 +8,6 @@
 #include "core/keywords.h"
 #include "core/state.h"
 #include "objects/buffers.h"
-#include "objects/decimal_float.h"
 #include "objects/value_assignment.h"
 #include "objects/value_display.h"
 #include "oci.h"
@@ -194,33 +193,6 @@ TEST(Values, ElementSizesByType) {
     }
     EXPECT_EQ(ElementSize(SQLT_PDN, 10, 10), 6u);
     EXPECT_EQ(ElementSize(SQLT_PDN, 31, 31), 16u);
-}
-
-TEST(Values, DecimalFloats) {
-    const struct {
-        const char* text;
-        uint32_t size;
-        const char* hex;  // least significant byte first
-    } cases[] = {
-        {"0", 8, "000000000000C031"},
-        {"1", 8, "010000000000C031"},
-        {"-1", 8, "010000000000C0B1"},
-        {"12.5", 8, "7D0000000000A031"},
-        {"9999999999999999", 8, "FFFFC06FF286736C"},
-        {"99999999999999995", 8, "0080C6A47E8D0332"},
-        {"1E384", 8, "0080C6A47E8DE35F"},
-        {"1E-398", 8, "0100000000000000"},
-        {"4E-399", 8, "0000000000000000"},
-        {"5E-399", 8, "0100000000000000"},
-        {"1", 16, "01000000000000000000000000004030"},
-        {"-0.1", 16, "01000000000000000000000000003EB0"},
-    };
-    for (const auto& c : cases) {
-        unsigned char bytes[16];
-        ASSERT_TRUE(DecimalFloatFromText(c.text, c.size, bytes)) << c.text;
-        Line hex;
-        EXPECT_EQ(hex.Hex(bytes, c.size).View(), c.hex) << c.text << " in " << c.size;
-    }
 }
 
 }  // namespace

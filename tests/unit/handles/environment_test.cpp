@@ -1,9 +1,10 @@
-// Texts of error records, and texts between UTF-8 and UTF-16.
+// Texts of error records, and texts put into the application's buffers.
 #include <gtest/gtest.h>
 
 #include "handles/environment.h"
 #include "handles/error_handle.h"
 #include "oci.h"
+#include "platform/utf.h"
 
 namespace {
 
@@ -44,39 +45,6 @@ TEST(ErrorTexts, NumberStateAndWords) {
     EXPECT_EQ(ErrorMessage(942, "SQLITE", "no such table: t\n"),
               "[KELP/SQLITE] ORA-00942: table or view does not exist: no such table: t\n");
     EXPECT_EQ(ErrorMessage(24374, "CLIENT", ""), "[KELP/CLIENT] ORA-24374: define missing before fetch\n");
-}
-
-std::string Units(std::u16string_view text) { return {reinterpret_cast<const char*>(text.data()), text.size() * 2}; }
-
-TEST(Utf, BothWaysAndWhatIsMalformed) {
-    const struct { std::string utf8; std::u16string utf16;
-    } good[] = {{"", u""},
-                {"a", u"a"},
-                {"\xC3\xA4", u"\u00E4"},
-                {"\xE2\x82\xAC", u"\u20AC"},
-                {"\xF0\x9F\x98\x80", u"\U0001F600"},
-                {"\xEF\xBF\xBF", u"\uFFFF"},
-                {std::string("a\0b", 3), std::u16string(u"a\0b", 3)}};
-    for (const auto& c : good) {
-        std::string out;
-        EXPECT_TRUE(utf::ToUtf16(c.utf8, out));
-        EXPECT_EQ(out, Units(c.utf16)) << c.utf8;
-        std::string back;
-        EXPECT_TRUE(utf::ToUtf8(out.data(), out.size(), back));
-        EXPECT_EQ(back, c.utf8);
-    }
-    for (const char* bad : {"\x80", "\xC3", "\xC0\x80", "\xE0\x80\x80", "\xED\xA0\x80", "\xF4\x90\x80\x80",
-                            "\xF8\x88\x80\x80\x80", "a\xE2\x82", "\xF5\x80\x80\x80"}) {
-        std::string out;
-        EXPECT_FALSE(utf::ToUtf16(bad, out)) << bad;
-    }
-    for (const std::u16string& bad :
-         {std::u16string(u"\xD800"), std::u16string(u"\xDC00"), std::u16string(u"a\xD800z")}) {
-        std::string out;
-        EXPECT_FALSE(utf::ToUtf8(bad.data(), bad.size() * 2, out));
-    }
-    std::string out;
-    EXPECT_FALSE(utf::ToUtf8("abc", 3, out)) << "half a unit";
 }
 
 TEST(TextToBuffer, CutsBetweenCharacters) {

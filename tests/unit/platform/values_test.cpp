@@ -1,11 +1,13 @@
-// Packed decimal, numbers from text, tagged memory, message texts.
+// Packed decimal, decimal floats, numbers from text, tagged memory, message texts.
 #include <gtest/gtest.h>
 
+#include <cstdio>
 #include <cstring>
 #include <limits>
 #include <string>
 #include <vector>
 
+#include "platform/decimal_float.h"
 #include "platform/memory.h"
 #include "platform/message_texts.h"
 #include "platform/numbers.h"
@@ -157,6 +159,105 @@ TEST(MessageTexts, OfSqlstates) {
         char area[100];
         const std::size_t length = SqlstateMessageText(area, sizeof area, 80, c.code);
         EXPECT_EQ(std::string(area, length), c.text) << c.code;
+    }
+}
+
+std::string Hex(const void* bytes, std::size_t size) {
+    std::string hex;
+    for (std::size_t index = 0; index < size; ++index) {
+        char pair[3];
+        std::snprintf(pair, sizeof pair, "%02X", static_cast<const unsigned char*>(bytes)[index]);
+        hex += pair;
+    }
+    return hex;
+}
+
+TEST(DecimalFloat, FromText) {
+    const struct {
+        const char* text;
+        std::size_t size;
+        const char* hex;  // least significant byte first
+    } cases[] = {
+        {"0", 8, "000000000000C031"},
+        {"0E500", 8, "000000000000C031"},
+        {"-0.00", 8, "000000000000C0B1"},
+        {"1", 8, "010000000000C031"},
+        {"-1", 8, "010000000000C0B1"},
+        {"12.5", 8, "7D0000000000A031"},
+        {"9999999999999999", 8, "FFFFC06FF286736C"},
+        {"99999999999999995", 8, "0080C6A47E8D0332"},
+        {"1E384", 8, "0080C6A47E8DE35F"},
+        {"1E-398", 8, "0100000000000000"},
+        {"4E-399", 8, "0000000000000000"},
+        {"5E-399", 8, "0100000000000000"},
+        {"1", 16, "01000000000000000000000000004030"},
+        {"-0.1", 16, "01000000000000000000000000003EB0"},
+    };
+    for (const auto& c : cases) {
+        unsigned char bytes[16];
+        ASSERT_TRUE(decimal_float::FromText(c.text, c.size, bytes)) << c.text;
+        EXPECT_EQ(Hex(bytes, c.size), c.hex) << c.text << " in " << c.size;
+    }
+    for (const char* text : {"", "-", ".", "1.2.3", "1E", "1E5x", "1E385", "1E2000000", "one"}) {
+        unsigned char bytes[] = "untouched";
+        EXPECT_FALSE(decimal_float::FromText(text, 8, bytes)) << text;
+        EXPECT_STREQ(reinterpret_cast<char*>(bytes), "untouched") << text;
+    }
+}
+
+TEST(DecimalFloat, PartsOfTheBytes) {
+    const struct {
+        const char* text;
+        std::size_t size;
+        bool negative;
+        int exponent;
+        unsigned long long coefficient;
+    } cases[] = {
+        {"-12.5", 8, true, -1, 125},
+        {"9999999999999999E369", 8, false, 369, 9999999999999999},
+        {"1E-398", 8, false, -398, 1},
+        {"-12.5", 16, true, -1, 125},
+        {"7E-6176", 16, false, -6176, 7},
+    };
+    for (const auto& c : cases) {
+        unsigned char bytes[16];
+        ASSERT_TRUE(decimal_float::FromText(c.text, c.size, bytes)) << c.text;
+        const decimal_float::Parts parts = decimal_float::Unpack(bytes, c.size);
+        EXPECT_EQ(parts.negative, c.negative) << c.text;
+        EXPECT_EQ(parts.exponent, c.exponent) << c.text;
+        EXPECT_TRUE(parts.coefficient == c.coefficient) << c.text;
+        EXPECT_FALSE(parts.nan || parts.infinite) << c.text;
+        unsigned char again[16];
+        decimal_float::Pack(parts, c.size, again);
+        EXPECT_EQ(Hex(again, c.size), Hex(bytes, c.size)) << c.text;
+    }
+    const struct { unsigned char top; bool infinite; bool nan; } specials[] = {
+        {0x78, true, false}, {0xF8, true, false}, {0x7C, false, true}, {0x7E, false, true}, {0x77, false, false}};
+    for (const auto& c : specials) {
+        const unsigned char bytes[8] = {0, 0, 0, 0, 0, 0, 0, c.top};
+        const decimal_float::Parts parts = decimal_float::Unpack(bytes, 8);
+        EXPECT_EQ(parts.infinite, c.infinite) << int{c.top};
+        EXPECT_EQ(parts.nan, c.nan) << int{c.top};
+    }
+}
+
+TEST(PackedDecimal, DigitsOfTheBytes) {
+    const struct { std::string packed; std::size_t room; int result; bool negative; const char* digits; } cases[] = {
+        {"\x12\x34\x5D", 5, kDecimalDone, true, "12345"}, {"\x12\x34\x5B", 5, kDecimalDone, true, "12345"},
+        {"\x12\x34\x5C", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5A", 5, kDecimalDone, false, "12345"},
+        {"\x12\x34\x5E", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5F", 5, kDecimalDone, false, "12345"},
+        {"\x00\x00\x7C"s, 1, kDecimalDone, false, "7"}, {"\x00\x0D"s, 1, kDecimalDone, true, ""},
+        {"\x12\x34\x5C", 4, kDecimalTooShort, false, "1234"}, {"\x12\x34\x59", 5, kDecimalBadSign, false, ""},
+        {"\x1A\x34\x5C", 5, kDecimalBadDigit, false, "1"},
+    };
+    for (const auto& c : cases) {
+        char digits[16] = {};
+        bool negative = false;
+        std::size_t count = 99;
+        EXPECT_EQ(ReadPackedDecimal(c.packed.data(), c.packed.size(), &negative, digits, c.room, &count), c.result)
+            << Hex(c.packed.data(), c.packed.size());
+        EXPECT_EQ(std::string(digits, count), c.digits) << Hex(c.packed.data(), c.packed.size());
+        EXPECT_EQ(negative, c.negative) << Hex(c.packed.data(), c.packed.size());
     }
 }
 

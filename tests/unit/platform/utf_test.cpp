@@ -1,0 +1,88 @@
+// UTF-8 and UTF-16: between each other, what is malformed, and cutting between characters.
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "platform/utf.h"
+
+namespace {
+
+using namespace std::string_literals;
+
+std::string Units(std::u16string_view text) {
+    return {reinterpret_cast<const char*>(text.data()), text.size() * 2};
+}
+
+TEST(Utf, BothWays) {
+    const struct { std::string utf8; std::u16string utf16; } cases[] = {
+        {"", u""},
+        {"a", u"a"},
+        {"\xC3\xA4", u"\u00E4"},
+        {"\xE2\x82\xAC", u"\u20AC"},
+        {"\xF0\x9F\x98\x80", u"\U0001F600"},
+        {"\xEF\xBF\xBF", u"\uFFFF"},
+        {"a\0b"s, u"a\0b"s},
+        {"sixteen letters!", u"sixteen letters!"},
+        {"seventeen lettersx\x7F", u"seventeen lettersx\x7F"},
+    };
+    for (const auto& c : cases) {
+        std::string out = "<";
+        EXPECT_TRUE(utf::ToUtf16(c.utf8, out)) << c.utf8;
+        EXPECT_EQ(out, "<" + Units(c.utf16)) << c.utf8;
+        std::string back = "<";
+        EXPECT_TRUE(utf::ToUtf8(out.data() + 1, out.size() - 1, back)) << c.utf8;
+        EXPECT_EQ(back, "<" + c.utf8);
+    }
+}
+
+// Texts are taken in blocks of eight characters: one that is none of ASCII may stand at every place of a block.
+TEST(Utf, OneCharacterAtEachPlaceOfAText) {
+    for (size_t length = 0; length <= 20; ++length) {
+        for (size_t place = 0; place <= length; ++place) {
+            std::string utf8(length, 'x');
+            std::u16string utf16(length, u'x');
+            utf8.insert(place, "\xC2\x80");
+            utf16.insert(place, u"\u0080");
+            std::string out, back;
+            ASSERT_TRUE(utf::ToUtf16(utf8, out));
+            ASSERT_EQ(out, Units(utf16)) << place << " of " << length;
+            ASSERT_TRUE(utf::ToUtf8(out.data(), out.size(), back));
+            ASSERT_EQ(back, utf8) << place << " of " << length;
+        }
+    }
+}
+
+TEST(Utf, MalformedTextsEndWhereTheyAreMalformed) {
+    for (const char* bad : {"\x80", "\xC3", "\xC0\x80", "\xE0\x80\x80", "\xED\xA0\x80", "\xF4\x90\x80\x80",
+                            "\xF8\x88\x80\x80\x80", "\xE2\x82", "\xF5\x80\x80\x80", "\xFF"}) {
+        std::string out;
+        EXPECT_FALSE(utf::ToUtf16("nine or so"s + bad, out)) << bad;
+        EXPECT_EQ(out, Units(u"nine or so")) << bad;
+    }
+    for (const std::u16string& bad : {u"\xD800"s, u"\xDC00"s, u"\xD800z"s, u"\xD800\xD800"s}) {
+        std::string out;
+        const std::string units = Units(u"nine or so" + bad);
+        EXPECT_FALSE(utf::ToUtf8(units.data(), units.size(), out));
+        EXPECT_EQ(out, "nine or so");
+    }
+    std::string out;
+    EXPECT_FALSE(utf::ToUtf8("a\0b", 3, out)) << "half a unit";
+}
+
+TEST(Utf, WhatIsShownReplacesEachMalformedByte) {
+    std::string out;
+    utf::ToUtf16Replacing("a\xFF\xE2\x82z", out);
+    EXPECT_EQ(out, Units(u"a\uFFFD\uFFFD\uFFFDz"));
+}
+
+TEST(Utf, NoCharacterIsTorn) {
+    const std::string utf8 = "\xC3\xA4\xF0\x9F\x98\x80z";  // of 2, 4 and 1 bytes
+    const size_t whole8[] = {0, 0, 2, 2, 2, 2, 6, 7, 7};
+    for (size_t room = 0; room < std::size(whole8); ++room) EXPECT_EQ(utf::WholeUtf8(utf8, room), whole8[room]) << room;
+    const std::string utf16 = Units(u"\u00E4\U0001F600z");  // of 2, 4 and 2 bytes
+    const size_t whole16[] = {0, 0, 2, 2, 2, 2, 6, 6, 8, 8};
+    for (size_t room = 0; room < std::size(whole16); ++room)
+        EXPECT_EQ(utf::WholeUtf16(utf16, room), whole16[room]) << room;
+}
+
+}  // namespace
