@@ -3,6 +3,7 @@
 #include <clocale>
 #include <cstdio>
 #include <cstring>
+#include <vector>
 
 #include "commands/families.h"
 #include "core/keywords.h"
@@ -32,30 +33,29 @@ constexpr char kIniFile[] = "kelpcli.ini";
 constexpr char kIniSection[] = "kelpci";
 constexpr size_t kIniRoom = 65000;
 
-Memory<char> AllocateIniRoom() {
-    return Memory<char>(static_cast<char*>(GetMem(kIniRoom)));
+void PrintSetting(const char* key, const char* value) {
+    if (*value == '\0') Message(kOutput, "%s not set\n", key);
+    else Message(kOutput, "%s=%.*s\n", key, static_cast<int>(kIniRoom - 1), value);
 }
 
-void PrintSetting(const char* key) {
-    const Memory<char> value = AllocateIniRoom();
+void ReadAndPrintSetting(const char* key) {
+    const Memory<char> value(static_cast<char*>(GetMem(kIniRoom)));
     if (value == nullptr) return;
     IniReadString(kIniFile, kIniSection, key, "", value.get(), kIniRoom);
-    if (value.get()[0] == '\0') Message(kOutput, "%s not set\n", key);
-    else Message(kOutput, "%s=%s\n", key, value.get());
+    PrintSetting(key, value.get());
 }
 
+// As many as there would be room for the keys of: logs have no more.
 void PrintAllSettings() {
-    const Memory<char> keys = AllocateIniRoom();
-    if (keys == nullptr) return;
-    IniReadString(kIniFile, kIniSection, nullptr, "", keys.get(), kIniRoom);
-    if (keys.get()[0] == '\0') Message(kOutput, "No sections found\n");
-    for (const char* key = keys.get(); *key != '\0'; key += std::strlen(key) + 1) PrintSetting(key);
+    const std::vector<IniSetting> settings = IniReadSection(kIniFile, kIniSection, kIniRoom);
+    if (settings.empty()) Message(kOutput, "No sections found\n");
+    for (const IniSetting& setting : settings) PrintSetting(setting.key.c_str(), setting.value.c_str());
 }
 
 // The one complaint about a word count that goes to the output stream.
 void ReadIni(const CommandRow& row, int count, char** words) {
     if (count > 2) return Message(kOutput, "Invalid Syntax: %s\n", row.usage);
-    if (count == 2) PrintSetting(words[1]);
+    if (count == 2) ReadAndPrintSetting(words[1]);
     else PrintAllSettings();
 }
 

@@ -1,4 +1,4 @@
-// Reading and writing settings.
+// Reading and writing settings. Any thread.
 #include "platform/ini.h"
 
 #include <algorithm>
@@ -26,16 +26,32 @@ std::size_t CopyText(std::string_view text, char* buffer, std::size_t capacity) 
     return length;
 }
 
-std::size_t CopyKeys(const IniText& ini, const char* section, char* buffer, std::size_t capacity) {
+// The settings whose keys, each with its closing zero, fit into the capacity together with an empty one.
+std::vector<IniSetting> SettingsWithin(std::size_t capacity, std::vector<IniSetting> settings) {
+    std::size_t length = 0;
+    const auto beyond = std::ranges::find_if(settings, [&](const IniSetting& setting) {
+        length += setting.key.size() + 1;
+        return length + 1 > capacity;
+    });
+    settings.erase(beyond, settings.end());
+    return settings;
+}
+
+std::size_t CopyKeys(const std::vector<IniSetting>& settings, char* buffer, std::size_t capacity) {
     if (capacity == 0) return 0;
     std::size_t length = 0;
-    for (const std::string& key : ini.Keys(section)) {
-        if (length + key.size() + 2 > capacity) break;
-        std::memcpy(buffer + length, key.c_str(), key.size() + 1);
-        length += key.size() + 1;
+    for (const IniSetting& setting : settings) {
+        std::memcpy(buffer + length, setting.key.c_str(), setting.key.size() + 1);
+        length += setting.key.size() + 1;
     }
     buffer[length] = '\0';
     return length;
+}
+
+IniText ReadIni(const char* file) {
+    std::string content;
+    if (!ReadWholeFile(PathOf(file), content)) content.clear();
+    return IniText(content);
 }
 
 bool IsOneLine(std::string_view text) {
@@ -59,12 +75,14 @@ bool CanHold(std::string_view section, std::string_view key, std::string_view va
 
 std::size_t IniReadString(const char* file, const char* section, const char* key, const char* otherwise, char* buffer,
                           std::size_t capacity) {
-    std::string content;
-    if (!ReadWholeFile(PathOf(file), content)) content.clear();
-    const IniText ini(content);
-    if (!key) return CopyKeys(ini, section, buffer, capacity);
+    if (!key) return CopyKeys(IniReadSection(file, section, capacity), buffer, capacity);
+    const IniText ini = ReadIni(file);
     const std::string* const value = ini.Find(section, key);
     return CopyText(value ? *value : otherwise ? otherwise : "", buffer, capacity);
+}
+
+std::vector<IniSetting> IniReadSection(const char* file, const char* section, std::size_t most_key_bytes) {
+    return SettingsWithin(most_key_bytes, ReadIni(file).Settings(section));
 }
 
 bool IniWriteString(const char* file, const char* section, const char* key, const char* value) {

@@ -6,12 +6,22 @@
 #pragma once
 
 #include <cstddef>
+#include <string>
+#include <vector>
 
 // Copies the value, or `otherwise` (null: the empty text) where there is none, cut to the capacity and terminated.
 // With a null key, all keys of the section in the order of the file, each ended by a NUL, and an empty one: keys that
 // do not fit whole are left out. Answers the bytes written, the closing NUL not counted.
 std::size_t IniReadString(const char* file, const char* section, const char* key, const char* otherwise, char* buffer,
                           std::size_t capacity);
+
+// All settings of a section in the order of the file, each key once, from one reading of the file. `most_key_bytes`
+// limits them as the capacity limits the keys above.
+struct IniSetting {
+    std::string key;
+    std::string value;
+};
+std::vector<IniSetting> IniReadSection(const char* file, const char* section, std::size_t most_key_bytes);
 
 // Sets a key, and makes file and section where they are missing. A null value removes the key. Everything else in the
 // file stays to the byte: comments, order, unknown lines, line ends; so do its permissions. The file is replaced as a

@@ -1,9 +1,11 @@
-// Reading and changing the text of an INI file.
+// Reading and changing the text of an INI file. Any thread.
 #include "platform/ini_text.h"
 
 #include <strings.h>
 
 #include <algorithm>
+#include <cctype>
+#include <unordered_set>
 
 namespace {
 
@@ -11,6 +13,12 @@ constexpr std::string_view kByteOrderMark = "\xEF\xBB\xBF";
 
 bool Same(std::string_view left, std::string_view right) {
     return left.size() == right.size() && strncasecmp(left.data(), right.data(), left.size()) == 0;
+}
+
+// Equal for what is the same name.
+std::string Folded(std::string name) {
+    for (char& character : name) character = static_cast<char>(std::tolower(static_cast<unsigned char>(character)));
+    return name;
 }
 
 std::string_view Trimmed(std::string_view text) {
@@ -61,14 +69,14 @@ const std::string* IniText::Find(std::string_view section, std::string_view key)
     return nullptr;
 }
 
-std::vector<std::string> IniText::Keys(std::string_view section) const {
-    std::vector<std::string> keys;
+std::vector<IniSetting> IniText::Settings(std::string_view section) const {
+    std::vector<IniSetting> settings;
+    std::unordered_set<std::string> known;
     for (const Line& line : lines_) {
         if (line.key.empty() || !Same(line.section, section)) continue;
-        const auto same = [&](const std::string& key) { return Same(key, line.key); };
-        if (std::ranges::none_of(keys, same)) keys.push_back(line.key);
+        if (known.insert(Folded(line.key)).second) settings.push_back({line.key, line.value});
     }
-    return keys;
+    return settings;
 }
 
 void IniText::Set(std::string_view section, std::string_view key, std::string_view value) {

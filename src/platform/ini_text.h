@@ -5,14 +5,16 @@
 #include <string_view>
 #include <vector>
 
+#include "platform/ini.h"
+
 class IniText {
 public:
     explicit IniText(std::string_view text);
 
     // Null when there is no such key.
     [[nodiscard]] const std::string* Find(std::string_view section, std::string_view key) const;
-    // Each key once, as it is written.
-    [[nodiscard]] std::vector<std::string> Keys(std::string_view section) const;
+    // Each key once, as it is first written, with the value it has there.
+    [[nodiscard]] std::vector<IniSetting> Settings(std::string_view section) const;
 
     void Set(std::string_view section, std::string_view key, std::string_view value);
     // False when there was none.

@@ -28,14 +28,14 @@ bool IsTextBuffer(const MemBuffer& buffer) {
     return false;
 }
 
-// Only the beginning is shown: the rest differs from run to run.
+// Only the beginning is shown: the rest differs from run to run. A text that is shorter is filled up with zeros.
 void PrintRowid(const void* text, ub2 length) {
     std::string shown;
-    if (!Utf16Mode)
-        shown.assign(static_cast<const char*>(text), std::min<size_t>(length, kShownCharacters));
-    else if (!convertFromUTF16(text, length, shown))
-        return;
-    Message(kOutput, "Length - %u Rowid %.*s...\n", length, static_cast<int>(kShownCharacters), shown.c_str());
+    if (!Utf16Mode) shown.assign(static_cast<const char*>(text), length);
+    else if (!convertFromUTF16(text, length, shown)) return;
+    shown.resize(kShownCharacters);
+    Line line;
+    line.Format("Length - %u Rowid ", length).Text(shown).Text("...\n").Print();
 }
 
 void RunRowidToChar(const CommandRow& row, int, char** words) {
