@@ -1,10 +1,10 @@
-// Finding where a statement stores values, by its pieces. Forms that are not understood are left as they are.
+// Finding where a statement stores values, by its pieces.
 #include "engine/sqlite/assignments.h"
 
 #include <algorithm>
 #include <cctype>
 #include <initializer_list>
-#include <utility>
+#include <string>
 
 #include "engine/sqlite/pieces.h"
 #include "engine/sqlite/table_columns.h"
@@ -16,27 +16,30 @@ constexpr std::ptrdiff_t kExactDigits = 15;
 
 class Finder {
 public:
-    Finder(sqlite3* database, std::string_view sql) : database_(database), sql_(sql), pieces_(Split(sql)) {}
+    Finder(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces, ValueTargets& targets)
+        : database_(database), sql_(sql), pieces_(pieces), targets_(targets) {}
 
-    ValueTargets Find() {
-        if (Is(0, "insert") || Is(0, "replace")) Insert();
-        else if (Is(0, "update")) Update();
-        return std::move(result_);
+    void Find() {
+        const bool with = Is(0, "with");
+        const std::size_t verb = with ? FindWord(1, {"insert", "replace", "update", "select", "delete"}) : 0;
+        if (Is(verb, "insert") || Is(verb, "replace")) Insert(verb);
+        else if (Is(verb, "update")) Update(verb);
     }
 
 private:
-    // An expression: pieces [first, last).
-    struct Span {
-        std::size_t first, last;
-    };
+    using Columns = std::vector<const TableColumn*>;
 
     bool Is(std::size_t index, std::string_view word) const {
         return index < pieces_.size() && IsWord(pieces_[index], word);
     }
-    std::size_t Begin(std::size_t index) const { return static_cast<std::size_t>(pieces_[index].data() - sql_.data()); }
+    // The offset of a piece; the end of the text behind the last one.
+    std::size_t Begin(std::size_t index) const {
+        return index < pieces_.size() ? static_cast<std::size_t>(pieces_[index].data() - sql_.data()) : sql_.size();
+    }
     std::size_t End(std::size_t index) const { return Begin(index) + pieces_[index].size(); }
 
-    // The first of the words at the depth of `from`, outside parentheses; the end of the text when there is none.
+    // The first of the words at the depth of `from`, outside parentheses, or the parenthesis that closes around it; the
+    // end of the text when there is none.
     std::size_t FindWord(std::size_t from, std::initializer_list<std::string_view> words) const {
         int depth = 0;
         for (std::size_t index = from; index < pieces_.size(); ++index) {
@@ -49,47 +52,67 @@ private:
         return pieces_.size();
     }
 
-    void Insert() {
-        std::size_t at = 1;
-        while (at < pieces_.size() && at < 4 && !Is(at, "into")) ++at;
+    void Insert(std::size_t verb) {
+        std::size_t at = verb + 1;
+        while (at < pieces_.size() && at < verb + 4 && !Is(at, "into")) ++at;
         if (!Is(at, "into")) return;
         at = ReadTable(database_, pieces_, at + 1, columns_);
         if (Is(at, "as")) at += 2;
-        std::vector<const TableColumn*> targets;
+        Columns targets;
         if (Is(at, "(")) {
-            for (++at; at < pieces_.size() && !Is(at, ")"); ++at) {
-                if (!Is(at, ",")) targets.push_back(FindColumn(columns_, pieces_[at]));
-            }
-            ++at;
+            at = ReadNames(at, targets);
         } else {
             for (const TableColumn& column : columns_) targets.push_back(&column);
         }
         if (Is(at, "values")) InsertValues(at + 1, targets);
         else if (Is(at, "select") || Is(at, "with")) InsertQuery(at, targets);
+        for (at = FindWord(at, {"do"}); at < pieces_.size(); at = FindWord(at + 1, {"do"})) {
+            if (Is(at + 1, "update")) Set(FindWord(at, {"set"}));
+        }
     }
 
-    void InsertValues(std::size_t at, const std::vector<const TableColumn*>& targets) {
+    // The columns named in the list that opens at `open`; answers where the text goes on behind it.
+    std::size_t ReadNames(std::size_t open, Columns& columns) const {
+        std::size_t at = open + 1;
+        for (; at < pieces_.size() && !Is(at, ")"); ++at) {
+            if (!Is(at, ",")) columns.push_back(FindColumn(columns_, pieces_[at]));
+        }
+        return at + 1;
+    }
+
+    void InsertValues(std::size_t at, const Columns& targets) {
         while (Is(at, "(")) {
-            std::size_t column = 0;
-            for (;;) {
-                const std::size_t end = FindWord(at + 1, {","});
-                if (end >= pieces_.size()) return;
-                if (column < targets.size()) Assign({at + 1, end}, targets[column]);
-                ++column;
-                at = end;
-                if (Is(end, ")")) break;
-            }
-            if (!Is(++at, ",")) return;
+            at = AssignList(at, targets);
+            if (!Is(at, ",")) return;
             ++at;
         }
     }
 
-    // insert into t <query> becomes
-    // with kelp_source(c1, ...) as (<query>) insert into t select kelp_store(c1, ...), ... from kelp_source
-    void InsertQuery(std::size_t at, const std::vector<const TableColumn*>& targets) {
+    // The expressions of the list that opens at `open`, one a column; answers where the text goes on behind it.
+    std::size_t AssignList(std::size_t open, const Columns& targets) {
+        std::size_t column = 0;
+        for (std::size_t at = open;; ++column) {
+            const std::size_t end = FindWord(at + 1, {","});
+            if (end >= pieces_.size()) return end;
+            if (column < targets.size()) Assign({at + 1, end}, targets[column]);
+            at = end;
+            if (Is(end, ")")) return end + 1;
+        }
+    }
+
+    void InsertQuery(std::size_t at, const Columns& targets) {
+        std::size_t end = FindWord(at, {"returning", "conflict", ";"});
+        const bool has_conflict = Is(end, "conflict");
+        if (has_conflict) --end;    // ON
+        WrapQuery({at, end}, targets, has_conflict);
+    }
+
+    // A query becomes "with kelp_source(c1, ...) as (<query>) select kelp_store(c1, ...), ... from kelp_source". What
+    // ON CONFLICT follows needs a condition before it.
+    void WrapQuery(Span query, const Columns& targets, bool with_condition) {
         const bool concerned = std::any_of(targets.begin(), targets.end(),
                                            [](const TableColumn* target) { return target && target->concerned; });
-        if (!concerned || FindWord(at, {"returning", "conflict", ";"}) != pieces_.size()) return;
+        if (!concerned || query.Size() == 0) return;
         std::string names;
         std::string values;
         for (std::size_t index = 0; index < targets.size(); ++index) {
@@ -98,41 +121,54 @@ private:
             names.append(separator).append(name);
             values.append(separator).append(Stored(name, targets[index]));
         }
-        const std::size_t query = Begin(at);
-        result_.sql = "with kelp_source(" + names + ") as (" + std::string(sql_.substr(query)) + "\n) " +
-                      std::string(sql_.substr(0, query)) + " select " + values + " from kelp_source";
+        targets_.edits.push_back({Begin(query.first), Begin(query.last), "with kelp_source(" + names + ") as (",
+                                  "\n) select " + values + " from kelp_source" + (with_condition ? " where 1 " : " ")});
     }
 
     static std::string Stored(const std::string& expression, const TableColumn* target) {
         if (!target || !target->concerned) return expression;
-        const std::string& name = target->column.name;
-        return "kelp_store(" + expression + ", " + Literal(target->declared) + ", " + Literal(name) + ")";
+        return "kelp_store(" + expression + Described(*target);
+    }
+    static std::string Described(const TableColumn& target) {
+        return ", " + Literal(target.declared) + ", " + Literal(target.column.name) + ")";
     }
 
-    void Update() {
-        std::size_t at = Is(1, "or") ? 3 : 1;
-        at = ReadTable(database_, pieces_, at, columns_);
-        at = FindWord(at, {"set"});
-        while (at < pieces_.size() && !EndsAssignments(at)) {
-            const std::size_t end = FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", ";"});
-            if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(columns_, pieces_[at + 1]));
+    void Update(std::size_t verb) {
+        const std::size_t at = ReadTable(database_, pieces_, Is(verb + 1, "or") ? verb + 3 : verb + 1, columns_);
+        Set(FindWord(at, {"set"}));
+    }
+
+    // From SET, or a comma between assignments, on.
+    void Set(std::size_t at) {
+        while (Is(at, "set") || Is(at, ",")) {
+            const std::size_t end =
+                FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", "on", ";"});
+            if (Is(at + 1, "(")) SetRow(at + 1);
+            else if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(columns_, pieces_[at + 1]));
             at = end;
         }
     }
 
-    bool EndsAssignments(std::size_t at) const { return !Is(at, "set") && !Is(at, ","); }
+    // (a, b) = (1, 2) or (a, b) = (select ...)
+    void SetRow(std::size_t open) {
+        Columns targets;
+        const std::size_t equals = ReadNames(open, targets);
+        if (!Is(equals, "=") || !Is(equals + 1, "(")) return;
+        const std::size_t first = equals + 2;
+        if (Is(first, "select") || Is(first, "with")) WrapQuery({first, FindWord(first, {})}, targets, false);
+        else AssignList(equals + 1, targets);
+    }
 
     void Assign(Span span, const TableColumn* target) {
-        if (!target || !target->concerned || span.first >= span.last) return;
-        const std::size_t index = span.last - span.first == 2 ? ParameterAt(pieces_, span.first) : kNoParameter;
+        if (!target || !target->concerned || span.Size() == 0 || IsHarmless(span, *target)) return;
+        const std::size_t index = span.Size() == 1 ? ParameterOf(pieces_[span.first]) : kNoParameter;
         if (index != kNoParameter) {
-            result_.parameters.push_back({index, target->column, Coercion::Purpose::store});
-        } else if (!IsHarmless(span, *target)) {
-            const std::string wrapped = Stored(IsLongNumber(span) ? "''" : "", target);    // kelp_store('', 'type', ...
-            const std::size_t middle = wrapped.find(',') - (IsLongNumber(span) ? 1 : 0);
-            result_.wraps.push_back({Begin(span.first), wrapped.substr(0, middle)});
-            result_.wraps.push_back({End(span.last - 1), wrapped.substr(middle)});
+            targets_.parameters.push_back({index, target->column, Coercion::Purpose::store});
+            return;
         }
+        const std::string quote = IsLongNumber(span) ? "'" : "";
+        targets_.edits.push_back(
+            {Begin(span.first), End(span.last - 1), "kelp_store(" + quote, quote + Described(*target)});
     }
 
     // A literal of a number with more digits than a real keeps: it is read as text.
@@ -145,7 +181,7 @@ private:
 
     // A null, and a plain number for a column of numbers without limits.
     bool IsHarmless(Span span, const TableColumn& target) const {
-        if (span.last - span.first != 1) return false;
+        if (span.Size() != 1) return false;
         const std::string_view piece = pieces_[span.first];
         if (Is(span.first, "null")) return true;
         return std::all_of(piece.begin(), piece.end(), [](unsigned char c) { return std::isdigit(c); }) &&
@@ -155,28 +191,16 @@ private:
 
     sqlite3* database_;
     std::string_view sql_;
-    std::vector<std::string_view> pieces_;
+    const std::vector<std::string_view>& pieces_;
+    ValueTargets& targets_;
     std::vector<TableColumn> columns_;
-    ValueTargets result_;
 };
 
 }  // namespace
 
-std::string ValueTargets::Rewritten(std::string_view text) const {
-    std::string rewritten = sql;
-    if (!sql.empty() || wraps.empty()) return rewritten;
-    std::size_t copied = 0;
-    for (const Wrap& wrap : wraps) {
-        rewritten.append(text.substr(copied, wrap.at - copied)).append(wrap.text);
-        copied = wrap.at;
-    }
-    return rewritten.append(text.substr(copied));
-}
-
-ValueTargets FindAssignments(sqlite3* database, std::string_view sql) {
-    const std::string_view word = FirstWord(sql);
-    const bool stores = IsWord(word, "insert") || IsWord(word, "replace") || IsWord(word, "update");
-    return stores ? Finder(database, sql).Find() : ValueTargets();
+void FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
+                     ValueTargets& targets) {
+    Finder(database, sql, pieces, targets).Find();
 }
 
 }  // namespace engine::sqlite

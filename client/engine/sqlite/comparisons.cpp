@@ -1,15 +1,19 @@
-// Finding comparisons: a name, an operator, a placeholder or a literal. SQLite compares dates as the texts that they
-// are kept as, and blanks at the end of a text count; the types of the columns know better.
+// Finding comparisons and what they compare.
 #include "engine/sqlite/comparisons.h"
 
 #include <algorithm>
 #include <array>
-#include <cctype>
+#include <deque>
 #include <string>
-#include <vector>
 
+#include "engine/sqlite/column_types.h"
+#include "engine/sqlite/function_values.h"
+#include "engine/sqlite/operands.h"
 #include "engine/sqlite/pieces.h"
+#include "engine/sqlite/select_list.h"
+#include "engine/sqlite/stored_number.h"
 #include "engine/sqlite/table_columns.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
@@ -18,178 +22,320 @@ bool IsOneOf(std::string_view piece, std::initializer_list<std::string_view> wor
     return std::any_of(words.begin(), words.end(), [&](std::string_view word) { return IsWord(piece, word); });
 }
 
+// What begins another condition, so that the comparison before it is over.
+bool EndsCondition(std::string_view piece) { return piece == "," || piece == ";" || IsKeyword(piece); }
+
+std::string BlobLiteral(std::string_view bytes) {
+    constexpr std::string_view kDigits = "0123456789abcdef";
+    std::string literal = "x'";
+    for (const char c : bytes) {
+        literal += kDigits[static_cast<unsigned char>(c) >> 4];
+        literal += kDigits[static_cast<unsigned char>(c) & 15];
+    }
+    return literal += '\'';
+}
+
+// What has been read from a text, as SQL writes it; empty for what it does not.
+std::string SqlLiteral(const Datum& value) {
+    switch (value.kind) {
+        case Kind::null: return "null";
+        case Kind::integer: return std::to_string(value.integer);
+        case Kind::text:
+        case Kind::timestamp: return Literal(value.Text());
+        case Kind::bytes: return BlobLiteral(value.Text());
+        case Kind::decimal: {
+            const StoredNumber number = StoredNumber::From(*static_cast<const OCINumber*>(value.data));
+            if (number.form == StoredNumber::Form::integer) return std::to_string(number.integer);
+            if (number.form == StoredNumber::Form::blob)
+                return BlobLiteral({reinterpret_cast<const char*>(number.blob), number.length});
+            return {};
+        }
+        default: return {};
+    }
+}
+
 class Finder {
 public:
-    Finder(sqlite3* database, std::string_view sql, ValueTargets& targets)
-        : database_(database), sql_(sql), pieces_(Split(sql)), targets_(targets) {}
+    Finder(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces, ValueTargets& targets)
+        : database_(database), sql_(sql), pieces_(pieces), operands_(pieces), targets_(targets) {}
 
-    void Find() {
-        for (std::size_t at = FirstCondition(); at < pieces_.size(); ++at) {
-            if (IsComparison(at)) Compare(at);
-            else if (IsOneOf(pieces_[at], {"between"})) Between(at);
-            else if (IsOneOf(pieces_[at], {"in"}) && At(at + 1) == "(") In(at);
+    Status Find() {
+        // By depth of parentheses: whether the names of a SET come, whether there has been a comparison.
+        struct Level {
+            bool sets = false;
+            bool compares = false;
+        };
+        std::vector<Level> levels(1);
+        for (std::size_t at = FirstExpression(); at < pieces_.size() && status_.Ok(); ++at) {
+            const std::string_view piece = pieces_[at];
+            Level& level = levels.back();
+            if (piece == "(") {
+                levels.emplace_back();
+            } else if (piece == ")") {
+                if (levels.size() > 1) levels.pop_back();
+            } else if (IsComparison(piece)) {
+                if (level.sets && IsAssignment(at)) continue;
+                if (level.compares) return Error(errors::kNotProperlyEnded, "a comparison of a comparison");
+                level.compares = true;
+                Compare(operands_.Before(at), operands_.From(at + 1));
+            } else if (EndsCondition(piece)) {
+                level.compares = false;
+                if (IsWord(piece, "set")) level.sets = true;
+                else if (IsOneOf(piece, {"where", "from", "returning", "order", "limit", "on"})) level.sets = false;
+                else if (IsWord(piece, "between")) Between(at);
+                else if (IsWord(piece, "in") && At(at + 1) == "(") In(at);
+                else if (IsWord(piece, "case")) Case(at);
+            }
         }
+        return status_;
     }
 
 private:
-    std::string_view At(std::size_t index) const {
-        return index < pieces_.size() ? pieces_[index] : std::string_view();
-    }
+    // A table of the statement, where it is named.
+    struct Table {
+        std::size_t scope = 0;
+        bool is_target = false;    // of an insert
+        std::string name;          // its alias, if it has one
+        std::vector<TableColumn> columns;
+    };
 
-    // What an update sets is stored, what a query lists names its columns: conditions come behind them.
-    std::size_t FirstCondition() const {
-        const bool is_update = IsWord(At(0), "update");
-        if (!is_update && !IsOneOf(At(0), {"select", "delete"})) return pieces_.size();
-        int depth = 0;
-        for (std::size_t at = 0; at < pieces_.size(); ++at) {
-            if (pieces_[at] == "(") ++depth;
-            if (pieces_[at] == ")") --depth;
-            if (depth == 0 && IsWord(pieces_[at], is_update ? "where" : "from")) return at;
-        }
-        return pieces_.size();
-    }
+    std::string_view At(std::size_t index) const { return operands_.At(index); }
 
-    // The first character of an operator.
-    bool IsComparison(std::size_t at) const {
-        const std::string_view piece = pieces_[at];
-        if (piece == "!") return At(at + 1) == "=";
-        return (piece == "=" || piece == "<" || piece == ">") && !IsOperatorPart(at - 1);
-    }
-    bool IsOperatorPart(std::size_t at) const {
-        const std::string_view piece = At(at);
-        return piece == "=" || piece == "<" || piece == ">" || piece == "!";
-    }
-
-    void Compare(std::size_t at) {
-        std::size_t right = at + 1;
-        while (IsOperatorPart(right)) ++right;
-        if (const std::string_view name = NameBefore(at); !name.empty()) {
-            Use(right, name);
-        } else if (const std::size_t value = ValueBefore(at); value < at) {
-            Use(value, NameAt(right));
-        }
-    }
-
-    void Between(std::size_t at) {
-        const std::string_view name = NameBefore(IsWord(At(at - 1), "not") ? at - 1 : at);
-        const std::size_t second = at + 1 + ValueSize(at + 1);
-        if (name.empty() || !IsWord(At(second), "and")) return;
-        Use(at + 1, name);
-        Use(second + 1, name);
-    }
-
-    void In(std::size_t at) {
-        const std::string_view name = NameBefore(IsWord(At(at - 1), "not") ? at - 1 : at);
-        if (name.empty()) return;
-        for (std::size_t value = at + 2; ValueSize(value) > 0; ++value) {
-            Use(value, name);
-            value += ValueSize(value);
-            if (At(value) != ",") return;
-        }
-    }
-
-    bool IsName(std::size_t at) const {
-        const std::string_view piece = At(at);
-        if (piece.empty()) return false;
-        const auto first = static_cast<unsigned char>(piece[0]);
-        return piece[0] == '"' || piece[0] == '_' || std::isalpha(first) || first >= 0x80;
-    }
-
-    // Whether something at `at` goes on as a larger expression.
-    bool Joins(std::size_t at) const {
-        const std::string_view piece = At(at);
-        return !piece.empty() && (std::string_view("+-*/%|&.(").find(piece[0]) != std::string_view::npos ||
-                                  IsOneOf(piece, {"collate"}));
-    }
-
-    // "name" or "table.name" that ends before `at` and is a whole operand: its last part; empty for anything else.
-    std::string_view NameBefore(std::size_t at) const {
-        if (at == 0 || !IsName(at - 1)) return {};
-        const std::size_t first = at >= 3 && At(at - 2) == "." && IsName(at - 3) ? at - 3 : at - 1;
-        const bool opens = first > 0 && At(first - 1) == "(";
-        return first > 0 && Joins(first - 1) && !opens ? std::string_view() : pieces_[at - 1];
-    }
-
-    std::string_view NameAt(std::size_t at) const {
-        if (!IsName(at)) return {};
-        const std::size_t last = At(at + 1) == "." && IsName(at + 2) ? at + 2 : at;
-        return Joins(last + 1) ? std::string_view() : pieces_[last];
-    }
-
-    // How many pieces the placeholder or the text literal at `at` has; 0: neither stands there.
-    std::size_t ValueSize(std::size_t at) const {
-        if (ParameterAt(pieces_, at) != kNoParameter) return 2;
-        return !At(at).empty() && At(at)[0] == '\'' ? 1 : 0;
-    }
-
-    // Where a value that ends before `at` begins; `at` when there is none.
-    std::size_t ValueBefore(std::size_t at) const {
-        for (const std::size_t size : {std::size_t{2}, std::size_t{1}}) {
-            if (at < size || ValueSize(at - size) != size) continue;
-            const std::size_t before = at - size - 1;    // beyond the end when the value stands first
-            return Joins(before) && At(before) != "(" ? at : at - size;
-        }
+    // Queries and changes are looked through from their start, what they define or explain is not; of create table and
+    // create view their query is.
+    std::size_t FirstExpression() const {
+        if (IsOneOf(At(0), {"select", "with", "values", "insert", "replace", "update", "delete"})) return 0;
+        if (!IsWord(At(0), "create")) return pieces_.size();
+        std::size_t at = 1;
+        while (IsOneOf(At(at), {"temp", "temporary"})) ++at;
+        if (!IsOneOf(At(at), {"table", "view"})) return pieces_.size();
+        while (at < pieces_.size() && !(IsWord(At(at), "as") && operands_.IsQuery({at + 1, pieces_.size()}))) ++at;
         return at;
     }
 
-    void Use(std::size_t value, std::string_view name) {
-        const std::size_t size = ValueSize(value);
-        if (size == 0 || name.empty() || Joins(value + size)) return;
-        const TableColumn* column = Resolve(name);
-        if (!column) return;
-        if (const std::size_t parameter = ParameterAt(pieces_, value); parameter != kNoParameter) {
-            targets_.parameters.push_back({parameter, column->column, Coercion::Purpose::compare});
+    // name = ... or (names) = ... behind SET or a comma
+    bool IsAssignment(std::size_t equals) const {
+        std::size_t first = equals - 1;
+        if (At(first) == ")") first = operands_.Partner(first);
+        return first > 0 && (IsWord(At(first - 1), "set") || At(first - 1) == ",");
+    }
+
+    void Compare(Span left, Span right) {
+        if (operands_.IsColumn(left) && operands_.IsColumn(right)) return;
+        const std::vector<Span> lefts = operands_.List(left);
+        const std::vector<Span> rights = operands_.List(right);
+        if (lefts.size() > 1 && lefts.size() == rights.size()) {
+            for (std::size_t index = 0; index < lefts.size(); ++index) Compare(lefts[index], rights[index]);
             return;
         }
-        // A literal with a quote inside is several pieces.
-        if (!At(value + 1).empty() && At(value + 1)[0] == '\'') return;
-        const auto begin = static_cast<std::size_t>(pieces_[value].data() - sql_.data());
-        targets_.wraps.push_back({begin, "kelp_compare("});
-        targets_.wraps.push_back({begin + pieces_[value].size(),
-                                  ", " + Literal(column->declared) + ", " + Literal(column->column.name) + ")"});
+        if (const TableColumn* column = TypeOf(left)) Use(right, *column);
+        else if (const TableColumn* other = TypeOf(right)) Use(left, *other);
     }
 
-    // The column of that name in the statement's tables, when its values are of a type that all of them agree on.
-    const TableColumn* Resolve(std::string_view name) {
-        if (!tables_read_) ReadTables();
+    Span Subject(std::size_t at) const { return operands_.Before(IsWord(At(at - 1), "not") ? at - 1 : at); }
+
+    void Between(std::size_t at) {
+        const Span subject = Subject(at);
+        const Span first = operands_.From(at + 1);
+        if (first.Size() == 0 || !IsWord(At(first.last), "and")) return;
+        Compare(subject, first);
+        Compare(subject, operands_.From(first.last + 1));
+    }
+
+    void In(std::size_t at) {
+        for (const Span& element : operands_.List({at + 1, operands_.Partner(at + 1) + 1}))
+            Compare(Subject(at), element);
+    }
+
+    // case d when '01-JAN-24' then ... end
+    void Case(std::size_t at) {
+        const Span subject = operands_.From(at + 1);
+        int depth = 1;
+        for (at = subject.last; at < pieces_.size() && subject.Size() > 0; ++at) {
+            if (At(at) == "(") at = operands_.Partner(at);
+            else if (IsWord(At(at), "case")) ++depth;
+            else if (IsWord(At(at), "end") && --depth == 0) return;
+            else if (IsWord(At(at), "when") && depth == 1) Compare(subject, operands_.From(at + 1));
+        }
+    }
+
+    // The column that an expression is, or one of the type of the date that it answers; null for anything else.
+    const TableColumn* TypeOf(Span span) {
+        span = operands_.Bare(span);
+        if (span.Size() == 0 || operands_.IsValue(span)) return nullptr;
+        if (operands_.IsColumn(span)) return Concerning(Resolve(span));
+        if (!IsName(At(span.first))) return nullptr;
+        const ExpressionType type = ReadType({pieces_.begin() + static_cast<std::ptrdiff_t>(span.first),
+                                              pieces_.begin() + static_cast<std::ptrdiff_t>(span.last)});
+        const TableColumn* column = nullptr;
+        if (!type.argument.empty()) {
+            const auto first = static_cast<std::size_t>(
+                std::find_if(pieces_.begin(), pieces_.end(),
+                             [&](auto piece) { return piece.data() == type.argument.front().data(); }) -
+                pieces_.begin());
+            column = Resolve({first, first + type.argument.size()});
+        } else if (!type.declared.empty()) {
+            TableColumn answered;
+            answered.declared = type.declared;
+            answered.concerned = ReadDeclaredType(type.declared, answered.column);
+            answers_.push_back(std::move(answered));
+            column = &answers_.back();
+        }
+        return column && IsDateType(column->column.type) ? column : nullptr;
+    }
+
+    static const TableColumn* Concerning(const TableColumn* column) {
+        return column && column->concerned && Coercion::ConcernsComparison(column->column) ? column : nullptr;
+    }
+
+    // What is compared with a column. A date takes anything but other columns and queries; columns of other types take
+    // placeholders and literals.
+    void Use(Span span, const TableColumn& column) {
+        const Span bare = operands_.Bare(span);
+        if (bare.Size() == 0) return;
+        if (operands_.IsValue(bare)) {
+            const std::size_t parameter = ParameterOf(At(bare.first));
+            if (parameter == kNoParameter) return UseLiteral(bare, column);
+            targets_.parameters.push_back({parameter, column.column, Coercion::Purpose::compare});
+        } else if (IsDateType(column.column.type) && !operands_.IsColumn(bare) && !operands_.IsQuery(bare) &&
+                   !IsWord(At(bare.first), "null") && !TypeOf(bare)) {
+            Wrap(span, column);
+        }
+    }
+
+    // A literal that is no value of the type is refused when the statement runs; in a view, when that is made.
+    void UseLiteral(Span span, const TableColumn& column) {
+        const std::string text = PlainText(At(span.first));
+        Datum value;
+        value.kind = Kind::text;
+        value.data = text.data();
+        value.length = static_cast<std::uint32_t>(text.size());
+        Coercion coercion(column.column, Coercion::Purpose::compare);
+        const Status status = coercion.Apply(value);
+        if (status.Failed() && IsWord(At(0), "create")) {
+            status_ = status;
+            return;
+        }
+        const std::string literal = status.Ok() ? SqlLiteral(value) : std::string();
+        if (literal.empty()) return Wrap(span, column);
+        Add(span, literal, "", true);
+    }
+
+    void Wrap(Span span, const TableColumn& column) {
+        Add(span, "kelp_compare(", ", " + Literal(column.declared) + ", " + Literal(column.column.name) + ")", false);
+    }
+
+    // The same value may be compared with two columns.
+    void Add(Span span, std::string before, std::string after, bool replaces) {
+        const auto begin = static_cast<std::size_t>(At(span.first).data() - sql_.data());
+        const std::string_view last = At(span.last - 1);
+        const auto end = static_cast<std::size_t>(last.data() - sql_.data()) + last.size();
+        for (const auto& edit : targets_.edits)
+            if (edit.begin == begin && edit.end == end && edit.after == after && edit.before == before) return;
+        targets_.edits.push_back({begin, end, std::move(before), std::move(after), replaces});
+    }
+
+    // ---- Names
+
+    // The column of a name: of the table that the name says, or of those of the innermost query that has one so called;
+    // else of any table, as behind a subquery or WITH.
+    const TableColumn* Resolve(Span name) {
+        if (scopes_.empty()) ReadTables();
+        const std::string_view column = At(name.last - 1);
+        const std::string qualifier = name.Size() > 1 ? PlainName(At(name.last - 3)) : std::string();
+        const auto is_meant = [&](const Table& table) {
+            return qualifier.empty() || sqlite3_stricmp(table.name.c_str(), qualifier.c_str()) == 0;
+        };
+        for (std::size_t scope = scopes_[name.first];; scope = parents_[scope]) {
+            const auto in_scope = [&](const Table& table) { return table.scope == scope && is_meant(table); };
+            const TableColumn* found = Agreed(column, in_scope);
+            if (found || !status_.Ok()) return found;
+            if (parents_[scope] == scope) break;
+        }
+        return Agreed(column, [](const Table& table) { return !table.is_target; });
+    }
+
+    // The column of that name in the tables meant, if they agree on its type. Dates are too easily compared wrongly.
+    template <class Meant>
+    const TableColumn* Agreed(std::string_view name, Meant is_meant) {
         const TableColumn* found = nullptr;
-        for (const auto& columns : tables_) {
-            const TableColumn* column = FindColumn(columns, name);
+        for (const Table& table : tables_) {
+            const TableColumn* column = is_meant(table) ? FindColumn(table.columns, name) : nullptr;
             if (!column) continue;
-            if (found && found->column.type != column->column.type) return nullptr;
+            if (found && found->column.type != column->column.type) {
+                const bool dates = IsDateType(found->column.type) || IsDateType(column->column.type);
+                if (dates) status_ = Error(errors::kInconsistentTypes, "column " + column->column.name);
+                return nullptr;
+            }
             found = column;
         }
-        return found && found->concerned && Coercion::ConcernsComparison(found->column) ? found : nullptr;
+        return found;
     }
 
-    // Every name behind from, join, update and a comma in a from list that is a table's.
+    // The scope of each piece: a query, each part of a union for itself; what stands around the query of an insert is
+    // none of its own. And the tables that are named behind from, join, into and update.
     void ReadTables() {
-        tables_read_ = true;
-        for (std::size_t at = 0; at < pieces_.size();) {
-            if (!IsOneOf(pieces_[at++], {"from", "join", "update"})) continue;
-            for (;;) {
-                if (!IsName(at)) break;
-                at = ReadTable(database_, pieces_, at, tables_.emplace_back());
-                if (IsWord(At(at), "as")) ++at;
-                if (IsName(at) && At(at + 1) == ",") ++at;
-                if (At(at) != ",") break;
-                ++at;
+        scopes_.assign(pieces_.size(), 0);
+        parents_.assign(1, 0);
+        std::vector<std::size_t> open(1, 0);    // the scope at each depth of parentheses
+        const auto enter = [&](std::size_t parent) {
+            parents_.push_back(parent);
+            return parents_.size() - 1;
+        };
+        bool inserts = false;
+        for (std::size_t at = 0; at < pieces_.size(); ++at) {
+            const bool outside = open.size() == 1;
+            if (At(at) == "(") {
+                open.push_back(operands_.IsQuery({at + 1, pieces_.size()}) ? enter(open.back()) : open.back());
+            } else if (At(at) == ")" && !outside) {
+                open.pop_back();
+            } else if (IsOneOf(At(at), {"union", "except", "intersect"})) {
+                const std::size_t parent = parents_[open.back()];
+                open.back() = enter(parent == open.back() ? parents_.size() : parent);
+            } else if (IsWord(At(at), "select") && inserts && outside && open.back() == 0) {
+                open.back() = enter(parents_.size());
+            } else if (IsOneOf(At(at), {"conflict", "returning"}) && outside) {
+                open.back() = 0;
             }
+            scopes_[at] = open.back();
+            if (IsWord(At(at), "into")) inserts = true;
+            if (IsOneOf(At(at), {"from", "join", "into", "update"}))
+                ReadList(IsWord(At(at + 1), "or") ? at + 3 : at + 1, open.back(), IsWord(At(at), "into"));
+        }
+    }
+
+    void ReadList(std::size_t at, std::size_t scope, bool is_target) {
+        while (At(at) == "(") ++at;
+        while (IsName(At(at)) && !IsKeyword(At(at))) {
+            Table& table = tables_.emplace_back();
+            table.scope = scope;
+            table.is_target = is_target;
+            at = ReadTable(database_, pieces_, at, table.columns);
+            table.name = PlainName(At(at - 1));
+            if (IsWord(At(at), "as")) ++at;
+            if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
+            if (At(at) != ",") return;
+            ++at;
         }
     }
 
     sqlite3* database_;
     std::string_view sql_;
-    std::vector<std::string_view> pieces_;
+    const std::vector<std::string_view>& pieces_;
+    Operands operands_;
     ValueTargets& targets_;
-    bool tables_read_ = false;
-    std::vector<std::vector<TableColumn>> tables_;
+    Status status_;
+    std::vector<std::size_t> scopes_;     // by piece
+    std::vector<std::size_t> parents_;    // by scope; the outermost is its own
+    std::deque<Table> tables_;
+    std::deque<TableColumn> answers_;     // of calls
 };
 
 }  // namespace
 
-void FindComparisons(sqlite3* database, std::string_view sql, ValueTargets& targets) {
-    Finder(database, sql, targets).Find();
+Status FindComparisons(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
+                       ValueTargets& targets) {
+    return Finder(database, sql, pieces, targets).Find();
 }
 
 }  // namespace engine::sqlite

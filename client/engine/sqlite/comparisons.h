@@ -1,16 +1,22 @@
-// Values that a statement compares with a column: where hired > :1, where code in ('a ', :2), where :3 <= day.
+// Values that a statement compares with a column: where hired > :1, where code in ('a ', :2), where :3 <= day. SQLite
+// compares dates as the texts that they are kept as, and blanks at the end of a text count; the columns' types know
+// better.
 #pragma once
 
 #include <sqlite3.h>
 
 #include <string_view>
+#include <vector>
 
-#include "engine/sqlite/assignments.h"
+#include "engine/sqlite/value_targets.h"
+#include "handles/status.h"
 
 namespace engine::sqlite {
 
-// Adds the comparisons of a statement's conditions whose column all its tables agree on. Comparisons in the select list
-// and within larger expressions stay as they are.
-void FindComparisons(sqlite3* database, std::string_view sql, ValueTargets& targets);
+// Adds the comparisons of queries and changes, wherever they stand, whose one side is a column, or a call that answers a
+// date. Refuses what SQLite would answer as something else: 933 for a comparison of a comparison, 932 where a date's
+// column cannot be told from another of its name.
+Status FindComparisons(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
+                       ValueTargets& targets);
 
 }  // namespace engine::sqlite

@@ -5,12 +5,11 @@
 #include <thread>
 
 #include "engine/sqlite/accounts.h"
-#include "engine/sqlite/assignments.h"
-#include "engine/sqlite/comparisons.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/functions.h"
 #include "engine/sqlite/query.h"
 #include "engine/sqlite/sqlite.h"
+#include "engine/sqlite/value_targets.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {
@@ -105,8 +104,8 @@ Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& q
         return Error(errors::kNotProperlyEnded).From("SQLITE");
     }
 
-    ValueTargets targets = FindAssignments(database, sql);
-    FindComparisons(database, sql, targets);
+    ValueTargets targets;
+    if (Status status = FindValueTargets(database, sql, targets); status.Failed()) return status;
     const std::string rewritten = targets.Rewritten(sql);
     if (!rewritten.empty()) {
         StatementHandle checked = Compile(rewritten, code, nullptr);

@@ -4,6 +4,7 @@
 #include <algorithm>
 
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/connection.h"
 #include "engine/sqlite/functions.h"
 #include "engine/sqlite/pieces.h"
 #include "engine/sqlite/select_list.h"
@@ -100,6 +101,26 @@ bool IsNullable(sqlite3* database, sqlite3_stmt* statement, int index) {
     return not_null == 0 && primary_key == 0;
 }
 
+// The names that a statement's columns have as it was written. One with values in it that have been written anew has
+// another text.
+class WrittenNames {
+public:
+    WrittenNames(sqlite3* database, sqlite3_stmt* statement, std::string_view sql) : statement_(statement) {
+        if (sqlite3_sql(statement) == sql) return;
+        sqlite3_stmt* compiled = nullptr;
+        sqlite3_prepare_v2(database, sql.data(), static_cast<int>(sql.size()), &compiled, nullptr);
+        written_.reset(compiled);
+    }
+    const char* Name(int index) const {
+        sqlite3_stmt* named = index < sqlite3_column_count(written_.get()) ? written_.get() : statement_;
+        return sqlite3_column_name(named, index);
+    }
+
+private:
+    sqlite3_stmt* statement_;
+    StatementHandle written_;
+};
+
 void DescribeItem(const SelectItem& item, Column& column, bool& typed) {
     if (item.is_row_id) {
         if (!item.has_alias) column.name = "ROWID";    // SQLite names the key column that stands for it
@@ -139,9 +160,10 @@ void DescribeColumns(sqlite3* database, sqlite3_stmt* statement, std::string_vie
     const int count = sqlite3_column_count(statement);
     const std::vector<SelectItem> items = ReadSelectList(sql);
     const bool listed = items.size() == static_cast<std::size_t>(count);
+    const WrittenNames names(database, statement, sql);
     for (int index = 0; index < count; ++index) {
         Column column;
-        column.name = ShownName(sqlite3_column_name(statement, index), sql);
+        column.name = ShownName(names.Name(index), sql);
         const char* declared = sqlite3_column_decltype(statement, index);
         bool typed = declared && ReadDeclaredType(declared, column);
         column.nullable = IsNullable(database, statement, index);

@@ -152,6 +152,16 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_systimestamp", 0, 0, 0, Now<false>, "timestamp_tz"},
 };
 
+// What SQLite's own functions answer.
+constexpr struct {
+    std::string_view name;
+    ResultType result;
+} kEngineFunctions[] = {
+    {"count", {"number"}}, {"sum", {"number"}}, {"total", {"number"}}, {"avg", {"number"}},
+    {"abs", {"number"}},   {"round", {"number"}}, {"length", {"number"}}, {"row_number", {"number"}},
+    {"rank", {"number"}},  {"dense_rank", {"number"}}, {"max", {"", 1}}, {"min", {"", 1}},
+};
+
 std::array<std::span<const FunctionRow>, 4> Tables() {
     return {kFunctionRows, ConversionFunctions(), DateFunctions(), TextFunctions()};
 }
@@ -182,6 +192,9 @@ ResultType FunctionResult(std::string_view name) {
         for (const FunctionRow& row : table) {
             if (IsWord(name, row.name)) return {row.type, row.like};
         }
+    }
+    for (const auto& row : kEngineFunctions) {
+        if (IsWord(name, row.name)) return row.result;
     }
     return {};
 }

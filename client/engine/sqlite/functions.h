@@ -39,7 +39,8 @@ inline constexpr Dialect::Spelling kMoments[] = {
 
 Status AddFunctions(sqlite3* database);
 
-// What a call of a function answers: the declared type, or the argument, from 1, whose type it has.
+// What a call of a function answers, SQLite's own among them: the declared type, or the argument, from 1, whose type it
+// has. Empty: only its values tell.
 struct ResultType {
     std::string_view declared;
     int like = 0;

@@ -4,12 +4,29 @@
 #include <algorithm>
 #include <cctype>
 #include <cstdlib>
+#include <iterator>
 
 namespace engine::sqlite {
 namespace {
 
+bool IsDigit(char c) { return c >= '0' && c <= '9'; }
 bool IsWordCharacter(char c) {
     return std::isalnum(static_cast<unsigned char>(c)) || c == '_' || c == '$' || (c & 0x80) != 0;
+}
+
+// The longer of two that begin alike stands first.
+constexpr std::string_view kOperators[] = {"->>", "->", "<=", ">=", "<>", "!=", "==", "||", "<<", ">>"};
+
+// What stands between quotes, of which a doubled one is one. Brackets cannot be doubled.
+std::string Unquoted(std::string_view piece) {
+    const char quote = piece.front();
+    const std::string_view inside = piece.substr(1, piece.size() - 2);
+    std::string plain;
+    for (std::size_t at = 0; at < inside.size(); ++at) {
+        plain.push_back(inside[at]);
+        if (quote != '[' && inside[at] == quote && at + 1 < inside.size() && inside[at + 1] == quote) ++at;
+    }
+    return plain;
 }
 
 }  // namespace
@@ -19,15 +36,44 @@ std::string_view Pieces::Next() {
     const std::size_t begin = at_;
     if (at_ == sql_.size()) return {};
     const char c = sql_[at_];
-    if (c == '\'' || c == '"' || c == '`' || c == '[') {
-        const std::size_t end = sql_.find(c == '[' ? ']' : c, at_ + 1);
-        at_ = end == std::string_view::npos ? sql_.size() : end + 1;
-    } else if (IsWordCharacter(c)) {
-        while (at_ < sql_.size() && IsWordCharacter(sql_[at_])) ++at_;
-    } else {
-        ++at_;
-    }
+    const bool is_blob = (c == 'x' || c == 'X') && Character(at_ + 1) == '\'';
+    const auto* found = std::find_if(std::begin(kOperators), std::end(kOperators),
+                                     [&](std::string_view text) { return sql_.substr(at_).starts_with(text); });
+    if (is_blob) at_ = QuotedEnd(at_ + 1);
+    else if (c == '\'' || c == '"' || c == '`' || c == '[') at_ = QuotedEnd(at_);
+    else if (IsDigit(c) || (c == '.' && IsDigit(Character(at_ + 1)))) at_ = NumberEnd(at_);
+    else if (c == '?') at_ = WordEnd(at_ + 1);
+    else if (IsWordCharacter(c)) at_ = WordEnd(at_);
+    else at_ += found != std::end(kOperators) ? found->size() : 1;
     return sql_.substr(begin, at_ - begin);
+}
+
+// Behind the quoted part that opens at `quote`.
+std::size_t Pieces::QuotedEnd(std::size_t quote) const {
+    const char closing = sql_[quote] == '[' ? ']' : sql_[quote];
+    std::size_t end = quote;
+    do {
+        end = sql_.find(closing, end + 1);
+        if (end == std::string_view::npos) return sql_.size();
+        ++end;
+    } while (closing != ']' && Character(end) == closing);
+    return end;
+}
+
+std::size_t Pieces::NumberEnd(std::size_t begin) const {
+    std::size_t end = begin;
+    while (IsWordCharacter(Character(end)) || Character(end) == '.') {
+        const bool exponent = (Character(end) | 0x20) == 'e';
+        ++end;
+        const bool sign = Character(end) == '+' || Character(end) == '-';
+        if (exponent && sign && IsDigit(Character(end + 1))) ++end;
+    }
+    return end;
+}
+
+std::size_t Pieces::WordEnd(std::size_t begin) const {
+    while (begin < sql_.size() && IsWordCharacter(sql_[begin])) ++begin;
+    return begin;
 }
 
 void Pieces::SkipBlanks() {
@@ -51,22 +97,29 @@ bool IsWord(std::string_view piece, std::string_view lower) {
                       [](char a, char b) { return std::tolower(static_cast<unsigned char>(a)) == b; });
 }
 
-std::size_t ParameterAt(const std::vector<std::string_view>& pieces, std::size_t at) {
-    if (at + 1 >= pieces.size() || pieces[at] != "?") return kNoParameter;
-    const int number = std::atoi(std::string(pieces[at + 1]).c_str());
+std::size_t ParameterOf(std::string_view piece) {
+    if (piece.size() < 2 || piece[0] != '?') return kNoParameter;
+    const int number = std::atoi(std::string(piece.substr(1)).c_str());
     return number > 0 ? static_cast<std::size_t>(number) - 1 : kNoParameter;
+}
+
+bool IsName(std::string_view piece) {
+    if (piece.empty() || piece.back() == '\'') return false;
+    const auto first = static_cast<unsigned char>(piece[0]);
+    return first == '"' || first == '`' || first == '[' || first == '_' || std::isalpha(first) || first >= 0x80;
+}
+
+bool IsLiteral(std::string_view piece) { return !piece.empty() && piece[0] == '\''; }
+
+bool IsNumber(std::string_view piece) {
+    return !piece.empty() && (IsDigit(piece[0]) || (piece[0] == '.' && piece.size() > 1));
 }
 
 std::string PlainName(std::string_view piece) {
     const bool quoted = piece.size() >= 2 && (piece[0] == '"' || piece[0] == '`' || piece[0] == '[');
-    return std::string(quoted ? piece.substr(1, piece.size() - 2) : piece);
+    return quoted ? Unquoted(piece) : std::string(piece);
 }
 
-std::string_view FirstWord(std::string_view sql) {
-    Pieces pieces(sql);
-    std::string_view piece = pieces.Next();
-    while (piece == "(") piece = pieces.Next();
-    return piece;
-}
+std::string PlainText(std::string_view literal) { return Unquoted(literal); }
 
 }  // namespace engine::sqlite

@@ -1,5 +1,5 @@
-// Pieces of SQL text as SQLite reads it: words, quoted texts, single characters. Comments and blanks are no pieces. All
-// views are of the text.
+// Pieces of SQL text as SQLite reads it: words, numbers, quoted texts, placeholders, operators, single characters.
+// Comments and blanks are no pieces. All views are of the text. Pure functions; any thread.
 #pragma once
 
 #include <string>
@@ -16,6 +16,10 @@ public:
 
 private:
     void SkipBlanks();
+    [[nodiscard]] std::size_t QuotedEnd(std::size_t quote) const;
+    [[nodiscard]] std::size_t NumberEnd(std::size_t begin) const;
+    [[nodiscard]] std::size_t WordEnd(std::size_t begin) const;
+    [[nodiscard]] char Character(std::size_t index) const { return index < sql_.size() ? sql_[index] : '\0'; }
 
     std::string_view sql_;
     std::size_t at_ = 0;
@@ -26,14 +30,16 @@ std::vector<std::string_view> Split(std::string_view sql);
 // Without regard to letter case; `lower` is in lower case.
 bool IsWord(std::string_view piece, std::string_view lower);
 
-// The index, from 0, of the placeholder ?7 that stands at pieces[at]; kNoParameter for anything else.
+// The index, from 0, of a placeholder like ?7; kNoParameter for anything else.
 constexpr std::size_t kNoParameter = static_cast<std::size_t>(-1);
-std::size_t ParameterAt(const std::vector<std::string_view>& pieces, std::size_t at);
+std::size_t ParameterOf(std::string_view piece);
 
-// A name without its quotes.
+bool IsName(std::string_view piece);       // a word or quoted name
+bool IsLiteral(std::string_view piece);    // 'text'
+bool IsNumber(std::string_view piece);     // 12, .5, 1e-3; no sign
+
+// A name without its quotes; the text of a literal.
 std::string PlainName(std::string_view piece);
-
-// The first word behind blanks, comments and parentheses.
-std::string_view FirstWord(std::string_view sql);
+std::string PlainText(std::string_view literal);
 
 }  // namespace engine::sqlite

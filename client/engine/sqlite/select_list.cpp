@@ -5,6 +5,7 @@
 #include <array>
 
 #include "engine/sqlite/functions.h"
+#include "engine/sqlite/operands.h"
 #include "engine/sqlite/pieces.h"
 
 namespace engine::sqlite {
@@ -53,26 +54,63 @@ std::string CastType(const std::vector<std::string_view>& pieces) {
     return by_function ? std::string(cast->written) : std::string();
 }
 
-// The type of an expression as a declaration; empty when its text does not tell. sysdate and its like are (F()).
-std::string TypeOf(std::vector<std::string_view> pieces) {
-    for (;;) {
-        if (pieces.size() == 5 && pieces[0] == "(") pieces = {pieces.begin() + 1, pieces.end() - 1};
-        if (std::string type = CastType(pieces); !type.empty()) return type;
-        if (pieces.size() < 3 || pieces[1] != "(" || !ClosesLast(pieces, 1)) return {};
-        const ResultType result = FunctionResult(pieces[0]);
-        if (result.like == 0) return std::string(result.declared);
-        pieces = Argument(pieces, result.like);
+// Whether the pieces are numbers, calls, names and the like with nothing but arithmetic between them. Comparisons and
+// || are none, nor is what may be a name behind an operand.
+bool IsArithmetic(const std::vector<std::string_view>& pieces) {
+    const std::size_t first = !pieces.empty() && (pieces[0] == "-" || pieces[0] == "+") ? 1 : 0;
+    int depth = 0;
+    bool calculates = first == 1;
+    for (std::size_t index = first; index < pieces.size(); ++index) {
+        const std::string_view piece = pieces[index];
+        if (piece == "(") ++depth;
+        if (piece == ")") --depth;
+        if (depth > 0 || piece == ")" || piece == ".") continue;
+        const bool is_operator = piece.size() == 1 && std::string_view("+-*/%").find(piece[0]) != std::string_view::npos;
+        if (is_operator && index + 1 == pieces.size()) return false;    // t.*
+        calculates |= is_operator;
+        if (!is_operator && !IsNumber(piece) && ParameterOf(piece) == kNoParameter && !IsLiteral(piece) &&
+            (!IsName(piece) || IsKeyword(piece)))
+            return false;
     }
+    return calculates;
+}
+
+// Takes "over (...)" and "filter (...)" off the end.
+void CutWindow(std::vector<std::string_view>& pieces) {
+    int depth = 0;
+    for (std::size_t index = pieces.size(); index-- > 1;) {
+        if (pieces[index] == ")") ++depth;
+        if (pieces[index] == "(") --depth;
+        if (depth != 0) continue;
+        const bool is_window = IsWord(pieces[index - 1], "over") || IsWord(pieces[index - 1], "filter");
+        if (pieces[index] != "(" || !is_window) return;
+        pieces.resize(--index);
+    }
+}
+
+// Pieces that are an operand by themselves, so that a name behind them is an alias.
+bool EndsOperand(std::string_view piece) {
+    return piece == ")" || IsNumber(piece) || IsLiteral(piece) || ParameterOf(piece) != kNoParameter ||
+           IsWord(piece, "end") || (IsName(piece) && !IsKeyword(piece));
+}
+
+// "expression as name" or "expression name".
+bool CutAlias(std::vector<std::string_view>& pieces) {
+    if (pieces.size() < 2 || !IsName(pieces.back()) || IsKeyword(pieces.back())) return false;
+    const std::string_view before = pieces[pieces.size() - 2];
+    const bool by_word = pieces.size() > 2 && IsWord(before, "as");
+    if (!by_word && !EndsOperand(before)) return false;
+    pieces.resize(pieces.size() - (by_word ? 2 : 1));
+    return true;
 }
 
 SelectItem ReadItem(std::string_view text) {
     std::vector<std::string_view> pieces = Split(text);
     SelectItem item;
-    item.has_alias = pieces.size() > 2 && IsWord(pieces[pieces.size() - 2], "as");
-    if (item.has_alias) pieces.resize(pieces.size() - 2);
+    item.has_alias = CutAlias(pieces);
     item.is_row_id = !pieces.empty() && IsWord(pieces.back(), "rowid") &&
                      (pieces.size() == 1 || (pieces.size() == 3 && pieces[1] == "."));
-    item.type = TypeOf(std::move(pieces));
+    item.type = ReadType(std::move(pieces)).declared;
     return item;
 }
 
@@ -85,6 +123,26 @@ bool EndsList(std::string_view piece) {
 }
 
 }  // namespace
+
+ExpressionType ReadType(std::vector<std::string_view> pieces) {
+    for (;;) {
+        while (pieces.size() > 2 && pieces[0] == "(" && ClosesLast(pieces, 0))
+            pieces = {pieces.begin() + 1, pieces.end() - 1};
+        CutWindow(pieces);
+        if (pieces.empty()) return {};
+        if (pieces.size() == 1 && IsNumber(pieces[0])) return {"number", {}};
+        if (IsArithmetic(pieces)) return {"number", {}};
+        if (std::string type = CastType(pieces); !type.empty()) return {std::move(type), {}};
+        if (IsName(pieces[0]) && pieces.size() % 2 == 1 && (pieces.size() == 1 || pieces[1] == ".")) {
+            return {{}, std::move(pieces)};
+        }
+        if (pieces.size() < 3 || pieces[1] != "(") return {};
+        const ResultType result = FunctionResult(pieces[0]);
+        if (!ClosesLast(pieces, 1)) return {};
+        if (result.like == 0) return {std::string(result.declared), {}};
+        pieces = Argument(pieces, result.like);
+    }
+}
 
 std::vector<SelectItem> ReadSelectList(std::string_view sql) {
     Pieces pieces(sql);

@@ -1,5 +1,5 @@
-// The select list of a statement's text, as far as SQLite does not tell what an expression is: row ids, casts and
-// functions.
+// The select list of a statement's text, as far as SQLite does not tell what an expression is: row ids, casts, calls of
+// functions, arithmetic. Pure functions of the text.
 #pragma once
 
 #include <string>
@@ -11,10 +11,18 @@ namespace engine::sqlite {
 struct SelectItem {
     bool is_row_id = false;
     bool has_alias = false;
-    std::string type;    // as a declaration, of an expression that is wholly a cast or a call of a function; or empty
+    std::string type;    // as a declaration, of an expression whose text tells it; or empty
 };
 
 // One item a column; none when the text is no query whose list can be told, as with "*".
 std::vector<SelectItem> ReadSelectList(std::string_view sql);
+
+// What an expression answers: the type as a declaration, or the argument whose type it has, as trunc(hired) has that of
+// hired; neither when its pieces do not tell.
+struct ExpressionType {
+    std::string declared;
+    std::vector<std::string_view> argument;    // a name, or several with points between them
+};
+ExpressionType ReadType(std::vector<std::string_view> pieces);
 
 }  // namespace engine::sqlite

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <new>
 #include <utility>
 
 #include "engine/sqlite/coercion.h"
@@ -23,19 +24,24 @@ std::vector<TableColumn> ReadColumns(sqlite3* database, const std::string& schem
     sqlite3_stmt* compiled = nullptr;
     const char* sql = schema.empty() ? "select name, type from pragma_table_info(?1)"
                                      : "select name, type from pragma_table_info(?1, ?2)";
-    sqlite3_prepare_v2(database, sql, -1, &compiled, nullptr);
+    if (sqlite3_prepare_v2(database, sql, -1, &compiled, nullptr) == SQLITE_NOMEM) throw std::bad_alloc();
     const StatementHandle statement(compiled);
     if (!compiled) return columns;
     sqlite3_bind_text(compiled, 1, table.data(), static_cast<int>(table.size()), SQLITE_STATIC);
     if (!schema.empty()) sqlite3_bind_text(compiled, 2, schema.data(), static_cast<int>(schema.size()), SQLITE_STATIC);
-    while (sqlite3_step(compiled) == SQLITE_ROW) {
+    int code = SQLITE_OK;
+    while ((code = sqlite3_step(compiled)) == SQLITE_ROW) {
+        const auto* name = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
+        const auto* declared = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 1));
+        if (!name || !declared) throw std::bad_alloc();
         TableColumn column;
-        column.name = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
-        column.declared = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 1));
+        column.name = name;
+        column.declared = declared;
         column.concerned = ReadDeclaredType(column.declared, column.column) && Coercion::Concerns(column.column);
         column.column.name = UpperCase(column.name);
         columns.push_back(std::move(column));
     }
+    if ((code & 0xFF) == SQLITE_NOMEM) throw std::bad_alloc();
     return columns;
 }
 

@@ -281,11 +281,11 @@ TEST_F(EngineTest, ColumnsAreDescribed) {
                                  {"ID", SQLT_NUM, 22, 38, 0, false},
                                  {"H", SQLT_BDOUBLE, 16, 34, -127, true},
                                  {"I", SQLT_NUM, 22, 5, 0, true},
-                                 {"1+1", SQLT_CHR, 0, 0, 0, true},
+                                 {"1+1", SQLT_NUM, 22, 0, -127, true},
                                  {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true},
                                  {"ROWID", SQLT_RDD, 18, 0, 0, false},
                                  {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
-                                 {"COUNT(CAST(B AS DATE))", SQLT_CHR, 0, 0, 0, true}};
+                                 {"COUNT(CAST(B AS DATE))", SQLT_NUM, 22, 0, -127, true}};
     const auto& columns = query->Columns();
     ASSERT_EQ(columns.size(), std::size(expected));
     for (std::size_t index = 0; index < columns.size(); ++index) {

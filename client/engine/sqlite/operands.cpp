@@ -1,0 +1,166 @@
+// Reading expressions by their pieces, forwards and backwards.
+#include "engine/sqlite/operands.h"
+
+#include <algorithm>
+
+#include "engine/sqlite/pieces.h"
+
+namespace engine::sqlite {
+namespace {
+
+constexpr std::string_view kKeywords[] = {
+    "all",     "and",    "as",     "asc",    "between", "by",      "case",      "check",   "collate", "cross",
+    "default", "delete", "desc",   "distinct", "do",    "else",    "end",       "escape",  "except",  "exists",
+    "filter",  "from",   "full",   "glob",   "group",   "having",  "in",        "inner",   "insert",  "intersect",
+    "into",    "is",     "isnull", "join",   "left",    "like",    "limit",     "match",   "natural", "not",
+    "notnull", "null",   "nulls",  "offset", "on",      "or",      "order",     "outer",   "over",    "partition",
+    "regexp",  "returning", "right", "select", "set",   "then",    "union",     "update",  "using",   "values",
+    "when",    "where",  "window", "with"};
+
+constexpr std::string_view kArithmetic[] = {"+", "-", "*", "/", "%", "&", "|", "||", "<<", ">>", "->", "->>"};
+
+template <class List>
+bool Contains(const List& list, std::string_view piece) {
+    return std::find(std::begin(list), std::end(list), piece) != std::end(list);
+}
+
+}  // namespace
+
+bool IsKeyword(std::string_view piece) {
+    return std::any_of(std::begin(kKeywords), std::end(kKeywords), [&](auto word) { return IsWord(piece, word); });
+}
+
+bool IsComparison(std::string_view piece) {
+    constexpr std::string_view kComparisons[] = {"=", "==", "<>", "!=", "<", ">", "<=", ">="};
+    return Contains(kComparisons, piece);
+}
+
+Operands::Operands(const std::vector<std::string_view>& pieces) : pieces_(pieces), partners_(pieces.size() + 1) {
+    std::vector<std::size_t> open;
+    std::fill(partners_.begin(), partners_.end(), pieces.size());
+    for (std::size_t index = 0; index < pieces.size(); ++index) {
+        if (pieces[index] == "(") open.push_back(index);
+        if (pieces[index] != ")" || open.empty()) continue;
+        partners_[index] = open.back();
+        partners_[open.back()] = index;
+        open.pop_back();
+    }
+}
+
+// A word, literal, number or placeholder that is an operand, or begins one, by itself.
+bool Operands::IsOperand(std::size_t index) const {
+    const std::string_view piece = At(index);
+    if (piece.empty() || IsWord(piece, "null")) return !piece.empty();
+    if (IsName(piece)) return !IsKeyword(piece);
+    return piece.back() == '\'' || IsNumber(piece) || ParameterOf(piece) != kNoParameter;
+}
+
+// Behind the operand at `first`: its signs, its points, the arguments of a call and what follows them. `first` itself
+// when there is none.
+std::size_t Operands::OperandEnd(std::size_t first) const {
+    std::size_t at = first;
+    while (At(at) == "+" || At(at) == "-" || At(at) == "~") ++at;
+    if (At(at) == "(") return Partner(at) < pieces_.size() ? Partner(at) + 1 : first;
+    if (IsWord(At(at), "case")) return CaseEnd(at);
+    if (!IsOperand(at)) return first;
+    ++at;
+    while (At(at) == "." && IsName(At(at + 1))) at += 2;
+    if (At(at) != "(" || !IsName(At(at - 1))) return at;
+    if (Partner(at) >= pieces_.size()) return first;
+    at = Partner(at) + 1;
+    while ((IsWord(At(at), "over") || IsWord(At(at), "filter")) && At(at + 1) == "(") at = Partner(at + 1) + 1;
+    return at;
+}
+
+// Behind the END of the CASE at `first`; `first` itself when it has none.
+std::size_t Operands::CaseEnd(std::size_t first) const {
+    int depth = 0;
+    for (std::size_t at = first; at < pieces_.size(); ++at) {
+        if (At(at) == "(") at = Partner(at);
+        if (IsWord(At(at), "case")) ++depth;
+        if (IsWord(At(at), "end") && --depth == 0) return at + 1;
+    }
+    return first;
+}
+
+Span Operands::From(std::size_t first) const {
+    std::size_t end = OperandEnd(first);
+    while (end > first && Contains(kArithmetic, At(end))) {
+        const std::size_t next = OperandEnd(end + 1);
+        if (next == end + 1) return {first, first};
+        end = next;
+    }
+    return {first, end};
+}
+
+// Where the operand before `last` begins, without its signs; `last` itself when there is none.
+std::size_t Operands::OperandBegin(std::size_t last) const {
+    if (last == 0) return last;
+    std::size_t at = last - 1;
+    if (At(at) == ")") {
+        at = Partner(at);
+        if (at >= pieces_.size()) return last;
+        const bool follows_call = at > 0 && (IsWord(At(at - 1), "over") || IsWord(At(at - 1), "filter"));
+        if (follows_call) return OperandBegin(at - 1);
+        if (at == 0 || !IsName(At(at - 1)) || IsKeyword(At(at - 1))) return at;
+        --at;
+    } else if (!IsOperand(at)) {
+        return last;
+    }
+    while (at >= 2 && At(at - 1) == "." && IsName(At(at - 2))) at -= 2;
+    return at;
+}
+
+Span Operands::Before(std::size_t last) const {
+    std::size_t begin = OperandBegin(last);
+    while (begin < last && begin > 0 && Contains(kArithmetic, At(begin - 1))) {
+        const std::size_t earlier = OperandBegin(begin - 1);
+        if (earlier == begin - 1) {    // a sign
+            --begin;
+            break;
+        }
+        begin = earlier;
+    }
+    return {begin, last};
+}
+
+Span Operands::Bare(Span span) const {
+    while (span.Size() > 2 && At(span.first) == "(" && Partner(span.first) == span.last - 1) {
+        ++span.first;
+        --span.last;
+    }
+    return span;
+}
+
+bool Operands::IsValue(Span span) const {
+    return span.Size() == 1 && (IsLiteral(At(span.first)) || ParameterOf(At(span.first)) != kNoParameter);
+}
+
+bool Operands::IsColumn(Span span) const {
+    if (span.Size() % 2 == 0 || IsWord(At(span.first), "null")) return false;
+    for (std::size_t at = span.first; at < span.last; ++at) {
+        const bool is_point = (at - span.first) % 2 == 1;
+        if (is_point ? At(at) != "." : !IsName(At(at))) return false;
+    }
+    return true;
+}
+
+bool Operands::IsQuery(Span span) const {
+    return IsWord(At(span.first), "select") || IsWord(At(span.first), "with") || IsWord(At(span.first), "values");
+}
+
+std::vector<Span> Operands::List(Span span) const {
+    std::vector<Span> parts;
+    if (span.Size() < 2 || At(span.first) != "(" || Partner(span.first) != span.last - 1) return parts;
+    if (IsQuery({span.first + 1, span.last})) return parts;
+    std::size_t begin = span.first + 1;
+    for (std::size_t at = begin; at < span.last; ++at) {
+        if (At(at) == "(") at = Partner(at);
+        if (At(at) != "," && at + 1 != span.last) continue;
+        parts.push_back({begin, at});
+        begin = at + 1;
+    }
+    return parts;
+}
+
+}  // namespace engine::sqlite

@@ -1,0 +1,50 @@
+// Where an expression beside an operator begins and ends, and what it is. A view of the pieces of one statement.
+#pragma once
+
+#include <string_view>
+#include <vector>
+
+#include "engine/sqlite/value_targets.h"
+
+namespace engine::sqlite {
+
+class Operands {
+public:
+    explicit Operands(const std::vector<std::string_view>& pieces);
+
+    [[nodiscard]] std::string_view At(std::size_t index) const {
+        return index < pieces_.size() ? pieces_[index] : std::string_view();
+    }
+    // The parenthesis that belongs to the one at `index`; the end of the text for anything else.
+    [[nodiscard]] std::size_t Partner(std::size_t index) const { return partners_[index]; }
+
+    // The expression that begins at `first`, or ends before `last`, as far as arithmetic and || go; empty when none is
+    // understood.
+    [[nodiscard]] Span From(std::size_t first) const;
+    [[nodiscard]] Span Before(std::size_t last) const;
+
+    // Without the parentheses around the whole of it.
+    [[nodiscard]] Span Bare(Span span) const;
+    // A placeholder or a text literal; a name, or several with points between them.
+    [[nodiscard]] bool IsValue(Span span) const;
+    [[nodiscard]] bool IsColumn(Span span) const;
+    [[nodiscard]] bool IsQuery(Span span) const;
+    // The parts of (a, b, c); none for anything else.
+    [[nodiscard]] std::vector<Span> List(Span span) const;
+
+private:
+    [[nodiscard]] bool IsOperand(std::size_t index) const;
+    [[nodiscard]] std::size_t CaseEnd(std::size_t first) const;
+    [[nodiscard]] std::size_t OperandEnd(std::size_t first) const;
+    [[nodiscard]] std::size_t OperandBegin(std::size_t last) const;
+
+    const std::vector<std::string_view>& pieces_;
+    std::vector<std::size_t> partners_;
+};
+
+// Words that no column or function is named by.
+bool IsKeyword(std::string_view piece);
+
+bool IsComparison(std::string_view piece);
+
+}  // namespace engine::sqlite

@@ -1,0 +1,52 @@
+// What the values of a statement are for: the columns that it stores them into or compares them with. Placeholders keep
+// their place, and their values are made to fit. Literals that are compared are written as the column keeps its values;
+// other expressions are wrapped into calls of kelp_store(expression, 'declared type', 'column') or kelp_compare(...),
+// which do the same for each row. Used by the thread that compiles the statement.
+#pragma once
+
+#include <sqlite3.h>
+
+#include <cstddef>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "engine/engine.h"
+#include "engine/sqlite/coercion.h"
+#include "handles/status.h"
+
+namespace engine::sqlite {
+
+// Pieces [first, last) of a text.
+struct Span {
+    std::size_t first = 0;
+    std::size_t last = 0;
+    [[nodiscard]] std::size_t Size() const { return last - first; }
+};
+
+struct ValueTargets {
+    struct Parameter {
+        std::size_t index;    // from 0
+        Column column;
+        Coercion::Purpose purpose;
+    };
+    // The text's bytes [begin, end) get `before` and `after` around them, or give way to both. Edits may lie within
+    // each other, and may begin or end together; they do not overlap otherwise.
+    struct Edit {
+        std::size_t begin, end;
+        std::string before;
+        std::string after;
+        bool replaces = false;
+    };
+    std::vector<Parameter> parameters;
+    std::vector<Edit> edits;    // in any order
+
+    // The statement with its edits; empty when there are none.
+    [[nodiscard]] std::string Rewritten(std::string_view text) const;
+};
+
+// Looks through a statement that SQLite has found to be well-formed. Refuses what compares values in a way whose
+// meaning cannot be told: 932, 933.
+Status FindValueTargets(sqlite3* database, std::string_view sql, ValueTargets& targets);
+
+}  // namespace engine::sqlite
