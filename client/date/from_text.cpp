@@ -48,7 +48,7 @@ public:
             if (!element.input) return errors::kNotForInput;
             if (const Errno number = Take(element)) return number;
         }
-        SkipBlanks();
+        if (!exact_) SkipBlanks();
         return rest_.empty() ? parsed_.Resolve(result) : errors::kModelEnds;
     }
 

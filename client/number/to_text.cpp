@@ -175,26 +175,35 @@ Decimal DecimalOf(const OCINumber& value) {
     return ToDecimal(digits);
 }
 
-Errno PutFixedModel(const OCINumber& value, const FormatModel& model, const Nls& nls, Writer* out) {
-    Job job{model, nls, DecimalOf(value)};
-    const int scale = model.point == 'V' ? model.places_after : 0;
-    const int places = model.places_before + scale;
-    OCINumber scaled = value, rounded;
-    if (model.scientific) {
-        if (const Errno error = Prec(value, model.places_after + 1, &rounded)) return error;
-    } else {
-        const bool too_large = WholePlaces(job.decimal) > model.places_before;
-        if (too_large) {
-            out->Repeat('#', static_cast<std::ptrdiff_t>(Width(job)));
-            return 0;
-        }
-        if (scale > 0 && !job.IsZero()) {
-            if (const Errno error = Shift(value, scale, &scaled)) return error;
-        }
-        if (const Errno error = Round(scaled, model.places_after - scale, &rounded)) return error;
+// Keeps the first `kept` digits, which may be none or fewer, half away from zero.
+void RoundDigits(Decimal* decimal, int kept) {
+    if (kept >= decimal->count) return;
+    const bool up = kept >= 0 && decimal->digits[kept] >= '5';
+    decimal->count = std::max(kept, 0);
+    const char stripped = up ? '9' : '0';
+    while (decimal->count > 0 && decimal->digits[decimal->count - 1] == stripped) --decimal->count;
+    if (up && decimal->count > 0) {
+        ++decimal->digits[decimal->count - 1];
+    } else if (up) {
+        decimal->digits[decimal->count++] = '1';
+        ++decimal->point;
     }
-    job.decimal = DecimalOf(rounded);
-    if (!model.scientific && WholePlaces(job.decimal) > places) return errors::kRoundingOverflow;
+    if (decimal->count == 0) decimal->point = 0;
+}
+
+// Rounds in decimal digits, so that all of them are kept whatever the point does. A negative value keeps its sign when
+// it becomes 0, as the model's elements speak of the value.
+Errno PutFixedModel(const OCINumber& value, const FormatModel& model, const Nls& nls, Writer* out) {
+    constexpr int kHighestPoint = 2 * (kMaxExponent + 1);
+    Job job{model, nls, DecimalOf(value)};
+    if (!model.scientific && WholePlaces(job.decimal) > model.places_before) {
+        out->Repeat('#', static_cast<std::ptrdiff_t>(Width(job)));
+        return 0;
+    }
+    RoundDigits(&job.decimal, model.scientific ? model.places_after + 1 : job.decimal.point + model.places_after);
+    const int most_whole = model.scientific ? kHighestPoint : model.places_before;
+    if (WholePlaces(job.decimal) > most_whole) return errors::kRoundingOverflow;
+    if (model.point == 'V' && !job.IsZero()) job.decimal.point += model.places_after;
     PutFilled(model.fill, Width(job), out, [&](Writer* writer) { PutNumber(job, writer); });
     return 0;
 }

@@ -142,6 +142,8 @@ TEST(DateFromText, Reads) {
         {"2024-02-09", "FXYYYY-MM-DD", "2024-02-09 00:00:00"},
         {"2024-2-9", "FXFMYYYY-MM-DD", "2024-02-09 00:00:00"},
         {"May       09, 1999", "FXMonth DD, YYYY", "1999-05-09 00:00:00"},
+        {"1999 MAY      ", "FXYYYY MONTH", "1999-05-01 00:00:00"},
+        {"1999-05-09  ", "FXYYYY-FXMM-DD", "1999-05-09 00:00:00"},
         {"01-JAN-2031", "DD-MON-RR", "2031-01-01 00:00:00"}};
     for (const auto& c : cases) EXPECT_EQ(Parse(c.text, c.model), c.value) << c.text << ' ' << c.model;
     EXPECT_EQ(Parse("9. märz 2024", "DD. MONTH YYYY", "german"), "2024-03-09 00:00:00");
@@ -166,6 +168,7 @@ TEST(DateFromText, Refuses) {
         {"123", "DAY", 1859},                   {"10 1", "HH AM", 1859},
         {"2012-01-05", "DD-MON-RR", 1861},      {"2024x02", "YYYY-MM", 1861},
         {"2024-ab", "YYYY\"-ac\"", 1861},       {"2024/02/01", "FXYYYY-MM-DD", 1861},
+        {"2024-02-01 ", "FXYYYY-MM-DD", 1830},  {"1999 MAY       ", "FXYYYY MONTH", 1830},
         {"2024-2-01", "FXYYYY-MM-DD", 1862},    {"2,24", "Y,YYY", 1862},
         {"2024-01", "YYYY-MM-DD", 1840},        {"", "YYYY", 1840},
         {"2024", "FXYYYY HH24", 1840},          {"2024-01-01 10", "YYYY-MM-DD", 1830},
