@@ -1,70 +1,42 @@
-// The bridge to MPFR, where functions without an exact decimal result are computed: a number as a binary real of any
-// precision, and back, with the question whether its decimal rounding is certain.
+// Where functions without an exact decimal result are computed: with a precision that grows until the decimal rounding is
+// certain.
 #pragma once
 
-#include <mpfr.h>
-
 #include "handles/errors.h"
-#include "number/digits.h"
-#include "number/number.h"
+#include "number/big_real.h"
+#include "number/elementary.h"
 
 namespace number {
 
-class Real {
-public:
-    explicit Real(mpfr_prec_t bits) { mpfr_init2(value_, bits); }
-    ~Real() { mpfr_clear(value_); }
-    Real(const Real&) = delete;
-    Real& operator=(const Real&) = delete;
+// Limbs of one attempt after the other. A value that the last one finds in the middle between two numbers is there: no
+// function of numbers of 40 digits comes so near otherwise.
+constexpr int kAttempts[] = {4, 8, 18};
+// By how many limbs an argument may be longer than the result.
+constexpr int kMostExtraLimbs = BigReal::kMaxLimbs - 18;
 
-    operator mpfr_ptr() { return value_; }
-    operator mpfr_srcptr() const { return value_; }
+// Of what is within its limits, the exponent of a function's argument or result in bits.
+constexpr long kBeyondNumbers = 450;  // 2^420 is 1E126
+constexpr long kBeyondPowers = 12;    // of an exponential's argument
 
-    [[nodiscard]] bool IsRegular() const { return mpfr_regular_p(value_) != 0; }  // not 0, infinite or NaN
-    [[nodiscard]] bool IsZero() const { return mpfr_zero_p(value_) != 0; }
-    [[nodiscard]] bool IsInfinite() const { return mpfr_inf_p(value_) != 0; }
-    [[nodiscard]] bool IsNan() const { return mpfr_nan_p(value_) != 0; }
-    [[nodiscard]] mpfr_prec_t Bits() const { return mpfr_get_prec(value_); }
-
-    // For a value that is not 0: 2^(Exponent() - 1) <= |value| < 2^Exponent().
-    [[nodiscard]] mpfr_exp_t Exponent() const { return mpfr_get_exp(value_); }
-
-private:
-    mpfr_t value_;
-};
-
-// The value rounded to the precision of *real: off by at most 1 in 2^precision of itself, exact where it fits.
-void ToReal(const Digits& digits, Real* real);
-
-// A rough binary exponent, at most 1 below or above that of the value, which is not 0.
-mpfr_exp_t RoughExponent(const Digits& digits);
-
-constexpr mpfr_prec_t kFirstPrecision = 176;
-// A value that is this many bits close to a tie is one: no function of numbers of 40 digits comes nearer otherwise.
-constexpr mpfr_prec_t kLastPrecision = 2048;
-
-// Rounds a real to a number's digits. `good_bits` says how far it can be trusted: it is off by at most 1 in 2^good_bits
-// of itself. False when that leaves the rounding open; `tie` then decides for half up.
-bool ToDigits(const Real& real, mpfr_prec_t good_bits, bool tie, Digits* digits);
-
-// Computes with more and more bits until the rounding is certain. compute(precision, Real*) -> good bits.
+// Computes and rounds. compute(limbs, BigReal* result, long* lost_bits) answers an error for what it can tell without
+// a result; lost_bits, 0 at first, is how many bits fewer than usual are right.
 template <class Compute> Errno Evaluate(Compute compute, OCINumber* result) {
-    for (mpfr_prec_t precision = kFirstPrecision;; precision *= 2) {
-        mpfr_clear_flags();
-        Real real(precision);
-        const mpfr_prec_t good_bits = compute(precision, &real);
-        if (real.IsNan()) return errors::kBadNumber;
+    for (const int limbs : kAttempts) {
+        BigReal real(limbs);
+        long lost_bits = 0;
+        if (const Errno error = compute(limbs, &real, &lost_bits)) return error;
         if (real.IsZero()) {
-            if (mpfr_underflow_p()) return errors::kNumberUnderflow;
             SetZero(result);
             return 0;
         }
-        constexpr mpfr_exp_t kBeyond = 450;  // 2^420 is 1E126
-        if (real.IsInfinite() || real.Exponent() > kBeyond) return errors::kNumberOverflow;
-        if (real.Exponent() < -kBeyond) return errors::kNumberUnderflow;
+        if (real.Exponent() > kBeyondNumbers) return errors::kNumberOverflow;
+        if (real.Exponent() < -kBeyondNumbers) return errors::kNumberUnderflow;
         Digits digits;
-        if (ToDigits(real, good_bits, precision > kLastPrecision, &digits)) return Pack(digits, result);
+        const bool last = limbs == kAttempts[std::size(kAttempts) - 1];
+        const long good_bits = BigReal::kLimbBits * limbs - kLostBits - lost_bits;
+        if (ToDigits(real, good_bits, last, &digits)) return Pack(digits, result);
     }
+    return errors::kNumberUnderflow;  // not reached: the last attempt decides
 }
 
 }  // namespace number

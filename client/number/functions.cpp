@@ -1,5 +1,7 @@
-// Exponential, trigonometric and hyperbolic functions. Each is a row: how to compute it, which arguments it takes, and
-// how an error of the argument, which is rounded to binary, grows on the way to the result.
+// Exponential, trigonometric and hyperbolic functions, made from those of binary reals. An argument is longer than the
+// result where the function needs it so.
+#include <iterator>
+
 #include "handles/errors.h"
 #include "number/binary.h"
 #include "number/digits.h"
@@ -9,39 +11,101 @@ namespace number {
 
 namespace {
 
-using Exponent = mpfr_exp_t;
+bool ReachesPowers(const BigReal& x) { return !x.IsZero() && x.Exponent() > kBeyondPowers; }
 
-struct Function {
-    int (*compute)(mpfr_ptr, mpfr_srcptr, mpfr_rnd_t);
-    // Bits that the argument gets beyond those of the result, by its exponent.
-    Exponent (*extra_bits)(Exponent x);
-    // A bound of log2 of the slope, by the exponents of argument and result.
-    Exponent (*slope)(Exponent x, Exponent y);
-    bool to_one = false;  // takes -1 to 1 only
-};
+// e^x, e^-x
+BigReal Reciprocal(const BigReal& x) { return BigReal::FromInteger(x.Count(), 1) / x; }
 
-Exponent None(Exponent) { return 2; }
-Exponent WholeBits(Exponent x) { return std::max<Exponent>(x, 0) + 2; }
-Exponent Flat(Exponent, Exponent) { return 0; }
-Exponent LikeResult(Exponent, Exponent y) { return y; }
-Exponent AtLeastOne(Exponent, Exponent y) { return std::max<Exponent>(y, 0) + 1; }
-Exponent Inverse(Exponent x, Exponent) { return std::min<Exponent>(-x, 0) + 1; }
-// 1 + y^2
-Exponent Squared(Exponent, Exponent y) { return std::max<Exponent>(2 * y, 0) + 1; }
-// 1 / sqrt(1 - x^2), where 1 - |x| is at least 1E-40; the result may be as small as 1E-20.
-Exponent NearOne(Exponent x) { return x >= 0 ? 140 : 2; }
-Exponent SteepNearOne(Exponent x, Exponent) { return x >= 0 ? 67 : 1; }
+using Compute = Errno (*)(const Digits& argument, int limbs, BigReal* result, long* lost_bits);
 
-constexpr Function kExp{mpfr_exp, WholeBits, LikeResult};
-constexpr Function kSin{mpfr_sin, WholeBits, Flat};
-constexpr Function kCos{mpfr_cos, WholeBits, Flat};
-constexpr Function kTan{mpfr_tan, WholeBits, Squared};
-constexpr Function kArcSin{mpfr_asin, NearOne, SteepNearOne, true};
-constexpr Function kArcCos{mpfr_acos, NearOne, SteepNearOne, true};
-constexpr Function kArcTan{mpfr_atan, None, Inverse};
-constexpr Function kHypSin{mpfr_sinh, WholeBits, AtLeastOne};
-constexpr Function kHypCos{mpfr_cosh, WholeBits, LikeResult};
-constexpr Function kHypTan{mpfr_tanh, None, Inverse};
+Errno ComputeExp(const Digits& argument, int limbs, BigReal* result, long*) {
+    const BigReal x = BigReal::FromDigits(limbs, argument);
+    if (ReachesPowers(x)) return x.IsNegative() ? errors::kNumberUnderflow : errors::kNumberOverflow;
+    *result = Exponential(x);
+    return 0;
+}
+
+Errno ComputeHypSin(const Digits& argument, int limbs, BigReal* result, long*) {
+    const BigReal x = BigReal::FromDigits(limbs, argument);
+    if (ReachesPowers(x)) return errors::kNumberOverflow;
+    *result = HyperbolicSine(x);
+    return 0;
+}
+
+Errno ComputeHypCos(const Digits& argument, int limbs, BigReal* result, long*) {
+    const BigReal x = BigReal::FromDigits(limbs, argument);
+    if (ReachesPowers(x)) return errors::kNumberOverflow;
+    const BigReal power = Exponential(x);
+    *result = (power + Reciprocal(power)).Times2(-1);
+    return 0;
+}
+
+// sinh / sqrt(1 + sinh^2)
+Errno ComputeHypTan(const Digits& argument, int limbs, BigReal* result, long*) {
+    const BigReal x = BigReal::FromDigits(limbs, argument), one = BigReal::FromInteger(limbs, 1);
+    if (ReachesPowers(x)) {
+        *result = x.IsNegative() ? one.Negated() : one;
+        return 0;
+    }
+    const BigReal sine = HyperbolicSine(x);
+    *result = sine / (one + sine * sine).SquareRoot();
+    return 0;
+}
+
+// Sine and cosine of an argument of any size: so many quarter turns are taken off that at most pi/4 is left. An argument
+// next to a multiple of pi/2 loses bits to that.
+Angle TurnBack(const Digits& argument, int limbs, long* lost_bits) {
+    const BigReal rough = BigReal::FromDigits(1, argument);
+    if (rough.IsZero() || rough.Exponent() < 0) {
+        const Angle angle = SineAndCosine(BigReal::FromDigits(limbs, argument).Magnitude());
+        return {argument.negative ? angle.sine.Negated() : angle.sine, angle.cosine};
+    }
+    const int extra = 1 + static_cast<int>(rough.Exponent() / BigReal::kLimbBits);
+    const int precision = limbs + std::min(extra + 1, kMostExtraLimbs);
+    const BigReal x = BigReal::FromDigits(precision, argument), half_pi = BigReal::HalfPi(precision);
+    unsigned quarter = 0;
+    const BigReal turns = (x / half_pi).Nearest(&quarter);
+    const BigReal rest = x - turns * half_pi;
+    if (!rest.IsZero()) *lost_bits = std::max(-rest.Exponent() - BigReal::kLimbBits, 0L);
+    const Angle angle = SineAndCosine(rest.Magnitude().WithLimbs(limbs));
+    const BigReal sine = rest.IsNegative() ? angle.sine.Negated() : angle.sine;
+    switch (quarter) {
+        case 0: return {sine, angle.cosine};
+        case 1: return {angle.cosine, sine.Negated()};
+        case 2: return {sine.Negated(), angle.cosine.Negated()};
+        default: return {angle.cosine.Negated(), sine};
+    }
+}
+
+Errno ComputeSin(const Digits& argument, int limbs, BigReal* result, long* lost_bits) {
+    *result = TurnBack(argument, limbs, lost_bits).sine;
+    return 0;
+}
+
+Errno ComputeCos(const Digits& argument, int limbs, BigReal* result, long* lost_bits) {
+    *result = TurnBack(argument, limbs, lost_bits).cosine;
+    return 0;
+}
+
+Errno ComputeTan(const Digits& argument, int limbs, BigReal* result, long* lost_bits) {
+    const Angle angle = TurnBack(argument, limbs, lost_bits);
+    *result = angle.sine / angle.cosine;
+    return 0;
+}
+
+// The angle of the point (x, y), from -pi to pi.
+BigReal AngleOf(const BigReal& y, const BigReal& x) {
+    const int count = y.Count();
+    const BigReal half_pi = BigReal::HalfPi(count);
+    BigReal angle = x.IsZero() ? half_pi : ArcTangent(y.Magnitude() / x.Magnitude());
+    if (x.IsNegative()) angle = half_pi.Times2(1) - angle;
+    return y.IsNegative() ? angle.Negated() : angle;
+}
+
+Errno ComputeArcTan(const Digits& argument, int limbs, BigReal* result, long*) {
+    *result = AngleOf(BigReal::FromDigits(limbs, argument), BigReal::FromInteger(limbs, 1));
+    return 0;
+}
 
 bool IsBeyondOne(const Digits& digits) {
     Digits one;
@@ -50,36 +114,43 @@ bool IsBeyondOne(const Digits& digits) {
     return CompareMagnitude(digits, one) > 0;
 }
 
-Errno Apply(const Function& function, const OCINumber& value, OCINumber* result) {
+// sqrt(1 - x^2) = sqrt((1 - x)(1 + x)). Next to 1 the difference loses up to 133 bits, so it has three limbs more.
+BigReal OtherSide(const Digits& x, int limbs) {
+    const int precision = limbs + 3;
+    const BigReal real = BigReal::FromDigits(precision, x), one = BigReal::FromInteger(precision, 1);
+    return ((one - real) * (one + real)).SquareRoot().WithLimbs(limbs);
+}
+
+Errno ComputeArcSin(const Digits& argument, int limbs, BigReal* result, long*) {
+    if (IsBeyondOne(argument)) return errors::kBadNumber;
+    *result = AngleOf(BigReal::FromDigits(limbs, argument), OtherSide(argument, limbs));
+    return 0;
+}
+
+Errno ComputeArcCos(const Digits& argument, int limbs, BigReal* result, long*) {
+    if (IsBeyondOne(argument)) return errors::kBadNumber;
+    *result = AngleOf(OtherSide(argument, limbs), BigReal::FromDigits(limbs, argument));
+    return 0;
+}
+
+Errno Apply(Compute compute, const OCINumber& value, OCINumber* result) {
     Digits digits;
     if (const Errno error = Unpack(value, &digits)) return error;
-    if (function.to_one && IsBeyondOne(digits)) return errors::kBadNumber;
-    const Exponent extra = function.extra_bits(digits.IsZero() ? 0 : RoughExponent(digits) + 1);
-    return Evaluate(
-        [&](mpfr_prec_t precision, Real* real) {
-            Real argument(precision + extra);
-            ToReal(digits, &argument);
-            function.compute(*real, argument, MPFR_RNDN);
-            if (!argument.IsRegular() || !real->IsRegular()) return precision - 1;
-            // |error of argument| <= 2^(x - bits), times the slope, against 2^(y - 1).
-            const Exponent x = argument.Exponent(), y = real->Exponent();
-            return std::min<mpfr_prec_t>(precision + extra - x - function.slope(x, y) + y - 1, precision) - 1;
-        },
-        result);
+    return Evaluate([&](int limbs, BigReal* real, long* lost) { return compute(digits, limbs, real, lost); }, result);
 }
 
 }  // namespace
 
-Errno Exp(const OCINumber& value, OCINumber* result) noexcept { return Apply(kExp, value, result); }
-Errno Sin(const OCINumber& value, OCINumber* result) noexcept { return Apply(kSin, value, result); }
-Errno Cos(const OCINumber& value, OCINumber* result) noexcept { return Apply(kCos, value, result); }
-Errno Tan(const OCINumber& value, OCINumber* result) noexcept { return Apply(kTan, value, result); }
-Errno ArcSin(const OCINumber& value, OCINumber* result) noexcept { return Apply(kArcSin, value, result); }
-Errno ArcCos(const OCINumber& value, OCINumber* result) noexcept { return Apply(kArcCos, value, result); }
-Errno ArcTan(const OCINumber& value, OCINumber* result) noexcept { return Apply(kArcTan, value, result); }
-Errno HypSin(const OCINumber& value, OCINumber* result) noexcept { return Apply(kHypSin, value, result); }
-Errno HypCos(const OCINumber& value, OCINumber* result) noexcept { return Apply(kHypCos, value, result); }
-Errno HypTan(const OCINumber& value, OCINumber* result) noexcept { return Apply(kHypTan, value, result); }
+Errno Exp(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeExp, value, result); }
+Errno Sin(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeSin, value, result); }
+Errno Cos(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeCos, value, result); }
+Errno Tan(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeTan, value, result); }
+Errno ArcSin(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeArcSin, value, result); }
+Errno ArcCos(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeArcCos, value, result); }
+Errno ArcTan(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeArcTan, value, result); }
+Errno HypSin(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeHypSin, value, result); }
+Errno HypCos(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeHypCos, value, result); }
+Errno HypTan(const OCINumber& value, OCINumber* result) noexcept { return Apply(ComputeHypTan, value, result); }
 
 Errno ArcTan2(const OCINumber& y, const OCINumber& x, OCINumber* result) noexcept {
     Digits y_digits, x_digits;
@@ -87,12 +158,9 @@ Errno ArcTan2(const OCINumber& y, const OCINumber& x, OCINumber* result) noexcep
     if (const Errno error = Unpack(x, &x_digits)) return error;
     if (y_digits.IsZero() && x_digits.IsZero()) return errors::kBadNumber;
     return Evaluate(
-        [&](mpfr_prec_t precision, Real* real) {
-            Real y_real(precision + 2), x_real(precision + 2);
-            ToReal(y_digits, &y_real);
-            ToReal(x_digits, &x_real);
-            mpfr_atan2(*real, y_real, x_real, MPFR_RNDN);
-            return precision - 3;
+        [&](int limbs, BigReal* real, long*) -> Errno {
+            *real = AngleOf(BigReal::FromDigits(limbs, y_digits), BigReal::FromDigits(limbs, x_digits));
+            return 0;
         },
         result);
 }
