@@ -115,10 +115,15 @@ sword ShowReal(Line& line, const ElementView& element) {
     return End(line);
 }
 
+// Room for the digits, the zeros that the scale adds before or behind them, sign, leading zero, point and closing zero.
+size_t RoomForDecimal(uint32_t precision, int scale) {
+    constexpr int kRest = 4;
+    const int digits = 2 * static_cast<int>(PackedDecimalSize(precision)) - 1;
+    return static_cast<size_t>(kRest + (scale < 0 ? digits - scale : std::max(digits, scale)));
+}
+
 sword ShowPackedDecimal(Line& line, const ElementView& element) {
-    constexpr size_t kSignPointAndEnd = 4;
-    const int digits = std::max<int>(element.precision, std::abs(element.scale));
-    std::string text(kSignPointAndEnd + static_cast<size_t>(digits), '\0');
+    std::string text(RoomForDecimal(element.precision, element.scale), '\0');
     // The type may have been changed, and the precision speak of more bytes than there are.
     const bool whole = PackedDecimalSize(element.precision) <= element.size;
     const int rc = !whole ? kDecimalBadSign

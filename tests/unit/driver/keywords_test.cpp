@@ -157,6 +157,7 @@ TEST(Keywords, BitmaskIsTheOrOfItsWords) {
         {"oci_threaded|oci_object", 3, ""},
         {"OCI_UTF16|oci_t", 16385, ""},
         {" oci_threaded | oci_object ", 3, ""},
+        {"\toci_thr\teaded|\t oci_object\t", 3, ""},
         {"oci_threaded|Bogus", 1, Unrecognized("Bogus")},
         {"oci_threaded|", 1, kEmptyWord},
         {"", 0, kEmptyWord},

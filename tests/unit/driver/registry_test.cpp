@@ -1,6 +1,7 @@
 // The tables of named objects: capacities and messages written down by hand, names, arrays, reserved words.
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <string>
 
 #include "objects/buffers.h"
@@ -70,6 +71,28 @@ TEST(Registry, TheLowestFreeSlotIsFilledFirst) {
     Release(Kind::svc, "second");
     Release(Kind::svc, "third");
     EXPECT_EQ(Printed([] { Release(Kind::svc, "third"); }), "Handle third not found\n");
+}
+
+// A slot that is taken anew is as new, but for a key's text: the library may still hold its address.
+TEST(Registry, ATakenSlotKeepsNothingOfTheFormerObject) {
+    auto* const statement = AsRecord<Kind::stmt>(Register(Kind::stmt, "s", &object_a, &object_b));
+    statement->utf16_mode = 16384;
+    auto* const bind = AsRecord<Kind::bind>(Register(Kind::bind, "b", &object_a, &object_b));
+    bind->statement = &object_a;
+    auto* const key = AsRecord<Kind::key>(Register(Kind::key, "k", &object_a, &object_b));
+    std::strcpy(key->text, "value");
+    for (const Kind kind : {Kind::stmt, Kind::bind, Kind::key}) {
+        const char* const name = kind == Kind::stmt ? "s" : kind == Kind::bind ? "b" : "k";
+        Release(kind, name);
+        NamedObject* const slot = Register(kind, "x", nullptr, nullptr);
+        EXPECT_EQ(slot->object, nullptr) << name;
+        EXPECT_EQ(slot->parent, nullptr) << name;
+        EXPECT_STREQ(slot->name, "x");
+        Release(kind, "x");
+    }
+    EXPECT_EQ(statement->utf16_mode, 0u);
+    EXPECT_EQ(bind->statement, nullptr);
+    EXPECT_STREQ(key->text, "value");
 }
 
 TEST(Registry, NamesAreCutToTheSlot) {
@@ -146,10 +169,13 @@ TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
         EXPECT_EQ(found.is_array, c.is_array) << c.word;
         EXPECT_EQ(found.index, c.index) << c.word;
     }
+    Release(Kind::lob, "arr");
+    EXPECT_EQ(Register(Kind::lob, "after", &object_a, nullptr), &*SlotsOf(Kind::lob).begin());
+    EXPECT_EQ(ResolveObject(Kind::lob, "after[0]"), &object_a) << "the slot of an array was taken by a single descriptor";
+    Release(Kind::lob, "after");
     EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "arr2[1]"); }), "Handle arr2 not found\n");
     EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "null[1]"); }), "");
     EXPECT_EQ(Printed([] { ResolveObject(Kind::stmt, "s[1]"); }), "Handle s[1] not found\n");
-    Release(Kind::lob, "arr");
     Release(Kind::lob, "one");
 }
 

@@ -8,9 +8,11 @@
 #include "core/keywords.h"
 #include "core/state.h"
 #include "objects/buffers.h"
+#include "objects/memory.h"
 #include "objects/value_assignment.h"
 #include "objects/value_display.h"
 #include "oci.h"
+#include "platform/memory.h"
 #include "support/printed.h"
 
 namespace {
@@ -163,6 +165,84 @@ TEST(Values, LengthsAreNotFollowedPastTheElement) {
         element.length = 65535;
         EXPECT_EQ(element.Show(), c.shown) << c.type << " of " << c.size;
     }
+}
+
+TEST(Values, PackedDecimalsShown) {
+    const struct {
+        std::string bytes;
+        uint16_t precision;
+        int16_t scale;
+        const char* shown;
+    } cases[] = {
+        {"\x12\x34\x5D", 5, 2, "-123.45\n"},
+        {"\x12\x34\x5D", 5, 5, "-0.12345\n"},
+        {"\x12\x34\x5D", 5, 7, "-0.0012345\n"},
+        {"\x12\x34\x5D", 5, -3, "-12345000\n"},
+        {"\x9D", 1, 1, "-0.9\n"},
+        {"\x9D", 1, 0, "-9\n"},
+        {std::string("\0\0\x0D", 3), 5, 5, "0.00000\n"},
+        {"\x12\x34\x51", 5, 2, "DecimalToText failed with rc - 2\n\n"},
+        {"\x12\xA4\x5C", 5, 2, "DecimalToText failed with rc - 1\n12\n"},
+        // The precision speaks of more bytes than the element has.
+        {"\x12\x3D", 5, 0, "DecimalToText failed with rc - 2\n\n"},
+        {"\x12\x3D", 65535, 0, "DecimalToText failed with rc - 2\n\n"},
+    };
+    for (const auto& c : cases) {
+        Element element(SQLT_PDN, static_cast<uint32_t>(c.bytes.size()));
+        std::memset(element.data, 0x1C, sizeof element.data);
+        std::memcpy(element.data, c.bytes.data(), c.bytes.size());
+        element.indicator = 0;
+        element.precision = c.precision;
+        element.scale = c.scale;
+        EXPECT_EQ(element.Show(), c.shown) << c.precision << "," << c.scale;
+    }
+}
+
+// The first and the last of each field, and the next beyond.
+TEST(Values, SevenByteDatesThatArePossible) {
+    const struct {
+        unsigned char bytes[7];
+        const char* shown;
+    } cases[] = {
+        {{100, 101, 1, 1, 1, 1, 1}, "\"0001-01-01-00:00:00\"\n"},
+        {{100, 100, 1, 1, 1, 1, 1}, "Invalid date found\n"},
+        {{100, 99, 12, 31, 24, 60, 60}, "\"-001-12-31-23:59:59\"\n"},
+        {{199, 199, 12, 31, 24, 60, 60}, "\"9999-12-31-23:59:59\"\n"},
+        {{200, 100, 1, 1, 1, 1, 1}, "Invalid date found\n"},
+        {{53, 88, 1, 1, 1, 1, 1}, "\"-4712-01-01-00:00:00\"\n"},
+        {{53, 87, 1, 1, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 0, 1, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 13, 1, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 0, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 4, 31, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 1, 0, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 1, 25, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 1, 1, 61, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 1, 1, 1, 61}, "Invalid date found\n"},
+        {{119, 100, 2, 29, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"},
+    };
+    for (const auto& c : cases) {
+        Element element(SQLT_DAT, 7);
+        std::memcpy(element.data, c.bytes, sizeof c.bytes);
+        element.indicator = 0;
+        EXPECT_EQ(element.Show(), c.shown) << testing::PrintToString(c.bytes);
+    }
+}
+
+TEST(Values, FreeingABufferGivesBackEveryBlock) {
+    const size_t before = PlatformOutstanding("harnix");
+    MemBuffer buffer{};
+    ASSERT_EQ(AllocateBuffer(buffer, nullptr, 10, 3, SQLT_STR, 0, 0), 0);
+    // What dynamic binds and defines attach.
+    buffer.dynamic.previous_lengths = static_cast<uint32_t*>(GetMem(3 * sizeof(uint32_t)));
+    buffer.dynamic.piece_lengths = static_cast<uint32_t*>(GetMem(3 * sizeof(uint32_t)));
+    buffer.dynamic.list = static_cast<MemBuffer**>(GetMem(sizeof(MemBuffer*)));
+    EXPECT_EQ(PlatformOutstanding("harnix"), before + 7);
+    FreeBufferBlocks(buffer);
+    EXPECT_EQ(PlatformOutstanding("harnix"), before);
+    FreeBufferBlocks(buffer);
+    EXPECT_EQ(PlatformOutstanding("harnix"), before) << "a second time there is nothing to free";
 }
 
 TEST(Values, ElementSizesByType) {

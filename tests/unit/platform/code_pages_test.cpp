@@ -61,6 +61,7 @@ TEST(CodePages, AreasOfEveryLength) {
         {943, 1208, "a\x82\xA0\xB1z"}, {1202, 943, Convert(943, 1202, "a\x82\xA0\xB1z").output},
         {1258, 1208, "xe\xEC" "e\xEC" "ae"},    // each e but the last is joined by its accent
         {1258, 1202, "xe\xEC" "ae\xEC"},        {1208, 37, "abcé"},
+        {1208, 819, "a中"},                      {1208, 943, "é中é"},  // substitutes that just fit
         {1208, 1202, "a\xFFz\xE4\xB8"},         {1202, 850, Convert(1208, 1202, "aй中z").output},
     };
     for (const auto& c : cases) {
