@@ -20,6 +20,8 @@ struct Dialect {
     std::span<const Spelling> types;         // replaced as whole words in definition statements and casts
     std::span<const Spelling> functions;     // replaced as whole words in expressions
     std::span<const Spelling> casts;         // type, function: "cast(e as T(a, b))" becomes "F(e, a, b)"
+    std::string_view counts_characters;      // behind the name of a text type, or its cast, whose size is in characters:
+                                             // varchar2(9 char); empty: every size is
     std::string_view dual;                   // in a from clause, for "dual"; an alias is added where there is none
     std::string_view minus;                  // between two queries, for "minus"
     std::string_view truncate_table;         // for "truncate table"

@@ -22,6 +22,7 @@ struct Column {
     std::string name;             // as the application sees it; unquoted names in upper case
     std::uint16_t type = 1;       // internal type code: SQLT_CHR, SQLT_NUM, SQLT_DAT, SQLT_AFC, SQLT_BIN, ...
     std::uint32_t size = 0;       // bytes; 0 when the engine sets no limit
+    std::uint32_t characters = 0; // the limit of a column that counts characters; 0: it counts bytes
     std::uint8_t precision = 0;   // decimal digits; 0 when not constrained
     std::int8_t scale = 0;        // -127: floating
     bool nullable = true;

@@ -1,3 +1,5 @@
+// Writing a step for an engine: one pass over its tokens, each of which is copied or replaced by what the dialect says.
+// No engine is known here. Linear in the text; one Rewriter serves one step, on the thread that compiles it.
 #include "sql/engine_text.h"
 
 #include <algorithm>
@@ -36,7 +38,11 @@ public:
     }
 
     EngineText Result() {
-        for (std::size_t index = 0; tokens_[index].kind != TokenKind::end;) index = Visit(index);
+        for (std::size_t index = 0; tokens_[index].kind != TokenKind::end;) {
+            if (index == default_end_) Insert(tokens_[index - 1].End(), ")");
+            index = Visit(index);
+        }
+        if (default_end_ + 1 == tokens_.size()) Insert(tokens_[default_end_ - 1].End(), ")");
         Copy(step_.end);
         return std::move(result_);
     }
@@ -107,6 +113,7 @@ private:
         if (IsTypePlace(index)) return VisitType(index);
         const bool in_type_size = !open_.empty() && open_.back().is_type_size;
         if (in_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
+        if (token.Is("default") && names_columns_ && !defines_code_) VisitDefault(index);
         if (token.Is("dual") && Previous(index).Is("from") && !dialect_.dual.empty()) {
             std::string table(dialect_.dual);
             Replace(token, token.End(), FollowedByAlias(index) ? table : table + " as dual");
@@ -120,7 +127,10 @@ private:
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);
         } else if (!cast_as_.empty() && cast_as_[index] > 0) {
-            Replace(token, token.End(), FindCast(cast_as_[index] + 1)->engine);
+            const std::size_t type = cast_as_[index] + 1;
+            std::string function(FindCast(type)->engine);
+            if (CountsCharacters(type)) function += dialect_.counts_characters;
+            Replace(token, token.End(), function);
         } else if (IsDateLiteral(index)) {
             return VisitDateLiteral(index);
         } else if (const auto* spelling = FindFunction(index)) {
@@ -178,6 +188,42 @@ private:
         return statement_.type == StatementType::alter && adds;
     }
 
+    // The default of a column is an expression by itself, which some engines want in parentheses unless it is a literal.
+    void VisitDefault(std::size_t index) {
+        const std::size_t first = index + 1;
+        const std::size_t last = DefaultEnd(first);
+        const bool has_sign = tokens_[first].Is("-") || tokens_[first].Is("+");
+        const bool is_name = tokens_[first].kind == TokenKind::word && !tokens_[first].Is("null") && !FindFunction(first);
+        if (IsDateLiteral(first) || (!is_name && last <= first + 1 + has_sign)) return;
+        Insert(tokens_[first].begin, "(");
+        default_end_ = last;
+    }
+
+    // Behind the expression: where its column's constraints, the next column or the end of the definition come.
+    std::size_t DefaultEnd(std::size_t first) const {
+        constexpr std::string_view kConstraints[] = {
+            "not", "null", "constraint", "primary", "unique", "check", "references", "collate", "generated", "enable",
+            "disable"};
+        std::size_t index = first;
+        for (int depth = 0; tokens_[index].kind != TokenKind::end; ++index) {
+            const Token& token = tokens_[index];
+            if (token.Is("(")) ++depth;
+            if (depth == 0 && (token.Is(")") || token.Is(",") || token.Is(";"))) break;
+            if (token.Is(")")) --depth;
+            const bool ends = index > first && depth == 0 &&
+                              std::any_of(std::begin(kConstraints), std::end(kConstraints),
+                                          [&](auto word) { return token.Is(word); });
+            if (ends) break;
+        }
+        return index;
+    }
+
+    // Whether the size of the type at `index` is told in characters: varchar2(9 char).
+    bool CountsCharacters(std::size_t index) const {
+        while (At(tokens_, index).kind == TokenKind::word) ++index;
+        return At(tokens_, index).Is("(") && At(tokens_, index + 2).Is("char");
+    }
+
     std::size_t VisitType(std::size_t index) {
         std::size_t end = index + 1;
         for (const auto& spelling : dialect_.types) {
@@ -189,6 +235,8 @@ private:
             Replace(tokens_[index], tokens_[end - 1].End(), replacement);
             break;
         }
+        while (At(tokens_, end).kind == TokenKind::word && CountsCharacters(end)) ++end;
+        if (CountsCharacters(end)) Insert(tokens_[end - 1].End(), dialect_.counts_characters);
         type_end_ = end;    // where the size in parentheses may follow
         return end;
     }
@@ -263,6 +311,14 @@ private:
         copied_ = source_end;
     }
 
+    void Insert(std::size_t place, std::string_view inserted) {
+        if (inserted.empty()) return;
+        Copy(place);
+        const std::size_t begin = result_.sql.size();
+        result_.sql.append(inserted);
+        result_.edits.push_back({place, place, begin, result_.sql.size()});
+    }
+
     // Leaves out the text up to `source_end`; answers the first token behind it.
     std::size_t Drop(std::size_t index, std::size_t source_end) {
         Replace(tokens_[index], source_end, "");
@@ -281,6 +337,7 @@ private:
     std::vector<Open> open_;
     std::vector<std::size_t> cast_as_;    // by token; 0: no cast that becomes a function
     std::size_t type_end_ = std::string_view::npos;
+    std::size_t default_end_ = std::string_view::npos;    // where a default's closing parenthesis comes
     std::size_t copied_ = 0;
     EngineText result_;
 };

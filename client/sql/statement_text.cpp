@@ -1,3 +1,5 @@
+// Scanning a statement: its kind by its first word, its placeholders, the steps of a block. A statement is one that
+// applications write: what begins with another word goes to no engine, whatever that would make of it.
 #include "sql/statement_text.h"
 
 #include <algorithm>
@@ -36,8 +38,6 @@ constexpr Leading kLeading[] = {
     {"rename", StatementType::unknown, 37, Run::definition},
     {"comment", StatementType::unknown, 38, Run::definition},
     {"analyze", StatementType::unknown, 62, Run::definition},
-    {"vacuum", StatementType::unknown, 0, Run::definition},
-    {"reindex", StatementType::unknown, 0, Run::definition},
     {"call", StatementType::call, kBlockCode, Run::change},
     {"begin", StatementType::begin, kBlockCode, Run::begin},
     {"declare", StatementType::declare, kBlockCode, Run::other},
@@ -124,11 +124,21 @@ private:
 
     void FindType() {
         const Leading* row = Decisive();
-        if (!row) return;
+        if (!row || !ExplainsStatement(row)) return Fail(errors::kInvalidStatement, tokens_[0]);
         result_.type = row->type;
         run_ = row->run;
         result_.function_code = row->run == Run::definition && row->function_code == 0
                                     ? DefinitionCode(tokens_, row->type) : row->function_code;
+    }
+
+    // What is explained is a statement of its own kind.
+    bool ExplainsStatement(const Leading* row) const {
+        if (row->word != "explain") return true;
+        std::size_t index = 1;
+        while (At(tokens_, index).Is("query") || At(tokens_, index).Is("plan") || At(tokens_, index).Is("for")) ++index;
+        const Leading* explained = FindLeading(At(tokens_, index));
+        return At(tokens_, index).Is("with") ||
+               (explained && (explained->run == Run::query || explained->run == Run::change));
     }
 
     void FindPlaceholders() {

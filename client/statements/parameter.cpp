@@ -38,7 +38,12 @@ Status DataSize(Parameter& parameter, AttributeValue& value) {
     return {};
 }
 Status Characters(Parameter& parameter, AttributeValue& value) {
-    value.integer = IsCharacters(parameter) ? Size(parameter) : 0;
+    const std::uint32_t characters = std::min<std::uint32_t>(parameter.column.characters, kLongestName);
+    value.integer = characters > 0 ? characters : IsCharacters(parameter) ? Size(parameter) : 0;
+    return {};
+}
+Status CountsCharacters(Parameter& parameter, AttributeValue& value) {
+    value.integer = parameter.column.characters > 0;
     return {};
 }
 Status Precision(Parameter& parameter, AttributeValue& value) {
@@ -97,7 +102,7 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_SCHEMA_NAME, Shape::text, kGet<NoText>, nullptr},
     {OCI_ATTR_POSITION, Shape::ub2, GetField<&Parameter::position>, nullptr},
     {OCI_ATTR_PTYPE, Shape::ub1, kGet<ParameterType>, nullptr},
-    {OCI_ATTR_CHAR_USED, Shape::ub1, kGet<NoFlag>, nullptr},
+    {OCI_ATTR_CHAR_USED, Shape::ub1, kGet<CountsCharacters>, nullptr},
     {OCI_ATTR_CHAR_SIZE, Shape::ub2, kGet<Characters>, nullptr},
     {OCI_ATTR_CHARSET_ID, Shape::ub2, kGet<NoFlag>, nullptr},
     {OCI_ATTR_CHARSET_FORM, Shape::ub1, kGet<CharacterForm>, nullptr},

@@ -1,10 +1,12 @@
 // Making values what a column takes: the cheap tests first, so that a value that fits costs little.
 #include "engine/sqlite/coercion.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 
 #include "date/format.h"
+#include "engine/sqlite/characters.h"
 #include "engine/sqlite/column_types.h"
 #include "handles/errors.h"
 #include "number/number.h"
@@ -78,6 +80,14 @@ int HexDigit(char c) {
     return -1;
 }
 
+// Whether a text in the engine's form has more than `digits` of a fraction.
+bool HasMoreDigits(std::string_view text, int digits) {
+    const std::size_t point = text.find('.');
+    if (point == std::string_view::npos) return false;
+    const std::size_t end = std::min(text.find_first_not_of("0123456789", point + 1), text.size());
+    return end - point - 1 > static_cast<std::size_t>(digits);
+}
+
 // Of texts in the engine's form: no year is written with two digits.
 bool IsTimeAlone(std::string_view text) { return text.size() > 2 && text[2] == ':'; }
 
@@ -99,7 +109,7 @@ Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)),
     if (purpose == Purpose::store) return;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) column_.type = SQLT_NUM;
     if (IsDateType(column_.type)) return;
-    column_.size = 0;
+    column_.size = column_.characters = 0;
     column_.precision = 0;
     column_.scale = kFloating;
 }
@@ -235,26 +245,30 @@ Status Coercion::ApplyBytes(Datum& value) {
 
 Status Coercion::ApplySize(const Datum& value) {
     const bool has_length = value.kind == Kind::text || value.kind == Kind::bytes || value.kind == Kind::timestamp;
-    if (!has_length || column_.size == 0 || value.length <= column_.size) return {};
+    const std::uint32_t most = column_.characters > 0 ? column_.characters : column_.size;
+    if (!has_length || most == 0 || value.length <= most) return {};
+    const std::int64_t actual = column_.characters > 0 ? CharacterCount(value.Text()) : value.length;
+    if (actual <= most) return {};
     return Error(errors::kTooLarge,
-                 "column " + column_.name + ", actual " + std::to_string(value.length) + ", maximum " +
-                     std::to_string(column_.size));
+                 "column " + column_.name + ", actual " + std::to_string(actual) + ", maximum " + std::to_string(most));
 }
 
 Status Coercion::ApplyDate(Datum& value) {
     if (value.kind != Kind::text && value.kind != Kind::timestamp) return Refuse(errors::kInconsistentTypes);
     constexpr std::size_t kPlainDate = 19;    // "YYYY-MM-DD HH:MM:SS"
     const std::string_view text = value.Text();
-    const bool as_it_is = purpose_ == Purpose::compare || column_.type != SQLT_DAT || text.size() == kPlainDate;
+    const bool fits = column_.type == SQLT_DAT ? text.size() == kPlainDate : !HasMoreDigits(text, column_.scale);
+    const bool as_it_is = purpose_ == Purpose::compare || fits;
     if (value.kind == Kind::timestamp && as_it_is && !IsTimeAlone(text)) return {};
     if (text.empty()) {
         value = {};
         return {};
     }
     date::DateTime read;
-    const int failure = ReadDate(text, column_.type, read);
-    if (failure != 0) return Refuse(failure);
+    int failure = ReadDate(text, column_.type, read);
     if (column_.type == SQLT_DAT) read.nanosecond = 0;
+    else if (failure == 0 && purpose_ == Purpose::store) failure = date::RoundFraction(read, column_.scale, &read);
+    if (failure != 0) return Refuse(failure);
     if (column_.type == SQLT_DAT || column_.type == SQLT_TIMESTAMP) read.has_zone = false;
     Set(value, Kind::timestamp, date_.data(), date::ToEngineText(read, date_.data()));
     return {};

@@ -7,13 +7,14 @@
 #include <cstdlib>
 #include <string>
 
+#include "engine/sqlite/functions.h"
 #include "oci.h"
 
 namespace engine::sqlite {
 namespace {
 
 // How the numbers in parentheses are meant.
-enum class Measure : std::uint8_t { none, size, digits, binary_digits, fraction };
+enum class Measure : std::uint8_t { none, size, characters, digits, binary_digits, fraction };
 
 struct TypeRow {
     std::string_view words;      // lower case; the declaration begins with them
@@ -25,6 +26,7 @@ struct TypeRow {
 };
 
 constexpr std::int8_t kFloating = -127;
+constexpr int kMostCharacters = 1 << 29;
 constexpr std::uint32_t kDateSize = 7;
 constexpr std::uint32_t kTimestampSize = 11;
 constexpr std::uint32_t kZonedTimestampSize = 13;
@@ -56,15 +58,15 @@ constexpr TypeRow kTypes[] = {
     {"binary_double", SQLT_IBDOUBLE, Measure::none, 8, 0, 0},
     {"varchar2", SQLT_CHR, Measure::size, 0, 0, 0},
     {"varchar", SQLT_CHR, Measure::size, 0, 0, 0},
-    {"nvarchar2", SQLT_CHR, Measure::size, 0, 0, 0},
-    {"nvarchar", SQLT_CHR, Measure::size, 0, 0, 0},
+    {"nvarchar2", SQLT_CHR, Measure::characters, 0, 0, 0},
+    {"nvarchar", SQLT_CHR, Measure::characters, 0, 0, 0},
     {"char varying", SQLT_CHR, Measure::size, 0, 0, 0},
     {"character varying", SQLT_CHR, Measure::size, 0, 0, 0},
     {"varying character", SQLT_CHR, Measure::size, 0, 0, 0},
     {"text", SQLT_CHR, Measure::size, 0, 0, 0},
     {"string", SQLT_CHR, Measure::size, 0, 0, 0},
-    {"nchar", SQLT_AFC, Measure::size, 1, 0, 0},
-    {"native character", SQLT_AFC, Measure::size, 1, 0, 0},
+    {"nchar", SQLT_AFC, Measure::characters, 1, 0, 0},
+    {"native character", SQLT_AFC, Measure::characters, 1, 0, 0},
     {"character", SQLT_AFC, Measure::size, 1, 0, 0},
     {"char", SQLT_AFC, Measure::size, 1, 0, 0},
     {"raw", SQLT_BIN, Measure::size, 0, 0, 0},
@@ -128,13 +130,24 @@ std::size_t Numbers(const std::string& normal, std::array<int, 2>& numbers) {
     return count;
 }
 
+// A size of one is meant where none is told of what counts characters.
+void CountCharacters(std::uint32_t characters, Column& column) {
+    constexpr std::uint32_t kMostBytes = 4;    // of a character in UTF-8
+    column.characters = characters;
+    column.size = characters * kMostBytes;
+}
+
 void Apply(Measure measure, const std::string& normal, Column& column) {
     std::array<int, 2> numbers{};
     const std::size_t count = Numbers(normal, numbers);
+    if (count == 0 && measure == Measure::characters) return CountCharacters(column.size, column);
     if (count == 0) return;
     switch (measure) {
         case Measure::none: break;
         case Measure::size: column.size = static_cast<std::uint32_t>(std::max(numbers[0], 0)); break;
+        case Measure::characters:
+            CountCharacters(static_cast<std::uint32_t>(std::clamp(numbers[0], 0, kMostCharacters)), column);
+            break;
         case Measure::digits:
             column.precision = static_cast<std::uint8_t>(std::clamp(numbers[0], 0, 38));
             column.scale = static_cast<std::int8_t>(count > 1 ? std::clamp(numbers[1], -84, 127) : 0);
@@ -149,7 +162,10 @@ void Apply(Measure measure, const std::string& normal, Column& column) {
 }  // namespace
 
 bool ReadDeclaredType(std::string_view declared, Column& column) {
-    const std::string normal = Normal(declared);
+    std::string normal = Normal(declared);
+    const std::size_t suffix = normal.find(kCountsCharacters);
+    const bool counts_characters = suffix != std::string::npos;
+    if (counts_characters) normal.erase(suffix, kCountsCharacters.size());
     const auto* row = std::find_if(std::begin(kTypes), std::end(kTypes),
                                    [&](const TypeRow& candidate) { return BeginsWithWords(normal, candidate.words); });
     if (row == std::end(kTypes)) return false;
@@ -157,7 +173,8 @@ bool ReadDeclaredType(std::string_view declared, Column& column) {
     column.size = row->size;
     column.precision = row->precision;
     column.scale = row->scale;
-    Apply(row->measure, normal, column);
+    column.characters = 0;
+    Apply(row->measure == Measure::size && counts_characters ? Measure::characters : row->measure, normal, column);
     return true;
 }
 

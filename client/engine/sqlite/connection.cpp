@@ -163,6 +163,7 @@ const Dialect& SqliteConnection::GetDialect() const {
         .types = kTypes,
         .functions = kMoments,
         .casts = kCasts,
+        .counts_characters = kCountsCharacters,
         .dual = "(select 'X' as dummy)",
         .minus = "except",
         .truncate_table = "delete from",

@@ -31,20 +31,28 @@ std::string_view Trimmed(std::string_view text) {
     return text;
 }
 
+// The cast that a function does; null for other words.
+const Dialect::Spelling* FindCast(std::string_view word, bool& counts_characters) {
+    counts_characters = word.ends_with(kCountsCharacters);
+    if (counts_characters) word.remove_suffix(kCountsCharacters.size());
+    const auto* found =
+        std::find_if(std::begin(kCasts), std::end(kCasts), [&](const auto& row) { return IsWord(word, row.engine); });
+    return found == std::end(kCasts) ? nullptr : found;
+}
+
 // An expression as the application wrote it: kelp_number(a , 5, 2) was cast(a as number(5, 2)).
 std::string AsWritten(std::string_view text) {
     Pieces pieces(text);
     const Dialect::Spelling* cast = nullptr;
+    bool counts_characters = false;
     std::size_t begin = 0;
     std::size_t open = 0;
     std::size_t comma = 0;
     int depth = 0;
     for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
         if (!cast) {
-            const auto found = std::find_if(std::begin(kCasts), std::end(kCasts),
-                                            [&](const auto& row) { return IsWord(piece, row.engine); });
-            if (found == std::end(kCasts)) continue;
-            cast = &*found;
+            cast = FindCast(piece, counts_characters);
+            if (!cast) continue;
             begin = pieces.At() - piece.size();
             open = pieces.At() + 1;
         } else if (piece == "(") {
@@ -56,7 +64,8 @@ std::string AsWritten(std::string_view text) {
             std::string written(text.substr(0, begin));
             written += "cast(" + AsWritten(Trimmed(text.substr(open, (comma ? comma : close) - open))) + " as ";
             written += cast->written;
-            if (comma) written.append("(").append(Trimmed(text.substr(comma + 1, close - comma - 1))).append(")");
+            if (comma) written.append("(").append(Trimmed(text.substr(comma + 1, close - comma - 1)));
+            if (comma) written.append(counts_characters ? " char)" : ")");
             return written + ")" + AsWritten(text.substr(close + 1));
         }
     }

@@ -1,6 +1,8 @@
+// Reading arguments and giving results back.
 #include "engine/sqlite/function_values.h"
 
 #include <array>
+#include <new>
 #include <string>
 
 #include "date/format.h"
@@ -27,11 +29,14 @@ void Refuse(sqlite3_context* context, int number) { Refuse(context, Error(number
 
 std::string_view Bytes(sqlite3_value* value) {
     const auto* bytes = static_cast<const char*>(sqlite3_value_blob(value));
-    return {bytes ? bytes : "", static_cast<std::size_t>(sqlite3_value_bytes(value))};
+    const auto size = static_cast<std::size_t>(sqlite3_value_bytes(value));
+    if (!bytes && size > 0) throw std::bad_alloc();
+    return {bytes ? bytes : "", size};
 }
 
 std::string_view TextOf(sqlite3_value* value) {
     const auto* text = reinterpret_cast<const char*>(sqlite3_value_text(value));
+    if (!text && sqlite3_value_type(value) != SQLITE_NULL) throw std::bad_alloc();
     return {text ? text : "", static_cast<std::size_t>(sqlite3_value_bytes(value))};
 }
 

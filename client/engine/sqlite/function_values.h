@@ -1,5 +1,6 @@
 // What SQL functions are made of: their table's row, arguments read, results and errors given back. Shared by the files
-// that hold the functions.
+// that hold the functions. A function may throw bad_alloc; the list catches it. Views of arguments live as long as the
+// call.
 #pragma once
 
 #include <sqlite3.h>
@@ -40,7 +41,7 @@ std::span<const FunctionRow> TextFunctions();
 void Refuse(sqlite3_context* context, const Status& status);
 void Refuse(sqlite3_context* context, int number);
 
-// Views of SQLite's own memory.
+// Views of SQLite's own memory. They throw bad_alloc where SQLite has none.
 std::string_view Bytes(sqlite3_value* value);
 std::string_view TextOf(sqlite3_value* value);
 

@@ -4,9 +4,11 @@
 #include <algorithm>
 #include <array>
 #include <memory>
+#include <new>
 #include <string>
 
 #include "date/date.h"
+#include "engine/sqlite/characters.h"
 #include "engine/sqlite/coercion.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/errors.h"
@@ -16,6 +18,7 @@
 #include "handles/errors.h"
 #include "number/number.h"
 #include "oci.h"
+#include "platform/utf.h"
 
 namespace engine::sqlite {
 namespace {
@@ -46,22 +49,16 @@ void ToDecimalFloat(sqlite3_context* context, int count, Arguments arguments) {
     ReturnNumber(context, number);
 }
 
-// The first `count` characters of UTF-8 text; how many there are.
-std::size_t CutCharacters(std::string& text, std::size_t count) {
-    std::size_t characters = 0;
-    for (std::size_t at = 0; at < text.size(); ++at) {
-        if ((static_cast<unsigned char>(text[at]) & 0xC0) == 0x80) continue;
-        if (characters == count) {
-            text.resize(at);
-            break;
-        }
-        ++characters;
-    }
-    return characters;
+enum class Unit : std::uint8_t { bytes, characters };
+
+// The first `count` units of a text, without part of a character; how many there are.
+std::size_t Cut(std::string& text, std::size_t count, Unit unit) {
+    text.resize(unit == Unit::bytes ? utf::WholeUtf8(text, count) : ByteOf(text, static_cast<std::int64_t>(count)));
+    return unit == Unit::bytes ? text.size() : static_cast<std::size_t>(CharacterCount(text));
 }
 
-// varchar(x), varchar(x, characters); char(x), char(x, characters), which pads with blanks
-template <bool padded>
+// varchar(x), varchar(x, size); char(x), char(x, size), which pads with blanks
+template <bool padded, Unit unit>
 void ToText(sqlite3_context* context, int count, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
     const TextArgument value(arguments[0]);
@@ -70,24 +67,28 @@ void ToText(sqlite3_context* context, int count, Arguments arguments) {
     const int limit = count > 1 ? sqlite3_value_int(arguments[1]) : padded ? 1 : 0;
     if (limit > 0) {
         const auto wanted = static_cast<std::size_t>(limit);
-        const std::size_t characters = CutCharacters(text, wanted);
+        const std::size_t kept = Cut(text, wanted, unit);
         constexpr std::size_t kLongestPadding = 32767;
-        if (padded && characters < wanted && wanted <= kLongestPadding) text.append(wanted - characters, ' ');
+        if (padded && kept < wanted && wanted <= kLongestPadding) text.append(wanted - kept, ' ');
     }
     sqlite3_result_text(context, text.data(), static_cast<int>(text.size()), SQLITE_TRANSIENT);
 }
 
-// date(x), which has no fraction and no zone; timestamp(x)
+// date(x), which has no fraction and no zone; timestamp(x), timestamp(x, digits), which rounds the fraction
 template <bool whole_seconds>
-void ToDate(sqlite3_context* context, int, Arguments arguments) {
+void ToDate(sqlite3_context* context, int count, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
     date::DateTime value;
-    const int failure = date::FromEngineText(TextOf(arguments[0]), &value);
-    if (failure != 0) return Refuse(context, failure);
+    int failure = date::FromEngineText(TextOf(arguments[0]), &value);
     if (whole_seconds) {
         value.nanosecond = 0;
         value.has_zone = false;
+    } else if (failure == 0) {
+        constexpr int kUsualDigits = 6;
+        const int digits = count > 1 ? std::clamp(sqlite3_value_int(arguments[1]), 0, 9) : kUsualDigits;
+        failure = date::RoundFraction(value, digits, &value);
     }
+    if (failure != 0) return Refuse(context, failure);
     ReturnDate(context, value);
 }
 
@@ -140,8 +141,12 @@ void Coerce(sqlite3_context* context, int, Arguments arguments) {
 constexpr FunctionRow kFunctionRows[] = {
     {"kelp_number", 1, 3, SQLITE_DETERMINISTIC, ToNumber},
     {"kelp_decfloat", 1, 2, SQLITE_DETERMINISTIC, ToDecimalFloat},
-    {"kelp_varchar", 1, 2, SQLITE_DETERMINISTIC, ToText<false>},
-    {"kelp_char", 1, 2, SQLITE_DETERMINISTIC, ToText<true>},
+    {"kelp_varchar", 1, 2, SQLITE_DETERMINISTIC, ToText<false, Unit::bytes>},
+    {"kelp_varchar_chars", 1, 2, SQLITE_DETERMINISTIC, ToText<false, Unit::characters>},
+    {"kelp_nvarchar", 1, 2, SQLITE_DETERMINISTIC, ToText<false, Unit::characters>},
+    {"kelp_char", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::bytes>},
+    {"kelp_char_chars", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::characters>},
+    {"kelp_nchar", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::characters>},
     {"kelp_date", 1, 1, SQLITE_DETERMINISTIC, ToDate<true>},
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
     {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::store>},
@@ -166,11 +171,23 @@ std::array<std::span<const FunctionRow>, 4> Tables() {
     return {kFunctionRows, ConversionFunctions(), DateFunctions(), TextFunctions()};
 }
 
+// SQLite is C: what a function throws must not reach it.
+void Call(sqlite3_context* context, int count, Arguments arguments) noexcept {
+    const auto* row = static_cast<const FunctionRow*>(sqlite3_user_data(context));
+    try {
+        row->call(context, count, arguments);
+    } catch (const std::bad_alloc&) {
+        sqlite3_result_error_nomem(context);
+    }
+}
+
+// The row must last, as those of the tables do.
 Status AddFunction(sqlite3* database, const FunctionRow& row) {
+    auto* kept = const_cast<FunctionRow*>(&row);
     const int first = row.most == kAnyCount ? kAnyCount : row.least;
     for (int arguments = first; arguments <= row.most; ++arguments) {
-        const int code = sqlite3_create_function_v2(database, row.name, arguments, SQLITE_UTF8 | row.flags, nullptr,
-                                                    row.call, nullptr, nullptr, nullptr);
+        const int code = sqlite3_create_function_v2(database, row.name, arguments, SQLITE_UTF8 | row.flags, kept, Call,
+                                                    nullptr, nullptr, nullptr);
         if (code != SQLITE_OK) return Failure(database, code);
     }
     return {};

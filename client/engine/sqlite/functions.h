@@ -18,15 +18,18 @@ inline constexpr Dialect::Spelling kCasts[] = {
     {"dec", "kelp_number"},
     {"varchar2", "kelp_varchar"},
     {"varchar", "kelp_varchar"},
-    {"nvarchar2", "kelp_varchar"},
+    {"nvarchar2", "kelp_nvarchar"},
     {"character varying", "kelp_varchar"},
     {"char varying", "kelp_varchar"},
     {"character", "kelp_char"},
-    {"nchar", "kelp_char"},
+    {"nchar", "kelp_nchar"},
     {"char", "kelp_char"},
     {"date", "kelp_date"},
     {"timestamp", "kelp_timestamp"},
 };
+
+// Behind the name of a text type, or of its cast, that counts characters: varchar2_chars(9).
+inline constexpr std::string_view kCountsCharacters = "_chars";
 
 // The words for the present moment; in parentheses, as a column's default needs its expression.
 inline constexpr Dialect::Spelling kMoments[] = {

@@ -5,6 +5,7 @@
 #include <cctype>
 #include <limits>
 
+#include "engine/sqlite/characters.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/describe.h"
 #include "engine/sqlite/stored_number.h"
@@ -268,9 +269,11 @@ void SqliteQuery::Fill(std::span<Datum> values) {
     }
 }
 
-// A fixed column's texts have its length.
+// A fixed column's texts have its length, in characters or bytes.
 void SqliteQuery::Pad(std::size_t column, Datum& value) {
-    const std::size_t size = columns_[column].size;
+    const std::size_t characters = columns_[column].characters;
+    const std::size_t more = characters > 0 ? value.length - static_cast<std::size_t>(CharacterCount(value.Text())) : 0;
+    const std::size_t size = (characters > 0 ? characters : columns_[column].size) + more;
     if (value.length >= size) return;
     padded_[column].assign(value.Text());
     padded_[column].resize(size, ' ');

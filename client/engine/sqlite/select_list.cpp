@@ -37,8 +37,11 @@ std::vector<std::string_view> Argument(const std::vector<std::string_view>& piec
 // cast(e as T(a, b)), or F(e, a, b) of a function that casts.
 std::string CastType(const std::vector<std::string_view>& pieces) {
     if (pieces.size() < 4 || pieces[1] != "(" || !ClosesLast(pieces, 1)) return {};
+    std::string_view name = pieces[0];
+    const bool counts_characters = name.ends_with(kCountsCharacters);
+    if (counts_characters) name.remove_suffix(kCountsCharacters.size());
     const auto* cast = std::find_if(std::begin(kCasts), std::end(kCasts), [&](const Dialect::Spelling& spelling) {
-        return IsWord(pieces[0], spelling.engine);
+        return IsWord(name, spelling.engine);
     });
     const bool by_function = cast != std::end(kCasts);
     if (!by_function && !IsWord(pieces[0], "cast")) return {};
@@ -49,7 +52,8 @@ std::string CastType(const std::vector<std::string_view>& pieces) {
         if (depth != 1 || !(by_function ? pieces[index] == "," : IsWord(pieces[index], "as"))) continue;
         const char* begin = pieces[index + 1].data();
         const std::string rest(begin, pieces.back().data());
-        return by_function ? std::string(cast->written) + '(' + rest + ')' : rest;
+        if (!by_function) return rest;
+        return std::string(cast->written).append(counts_characters ? kCountsCharacters : "") + '(' + rest + ')';
     }
     return by_function ? std::string(cast->written) : std::string();
 }

@@ -3,25 +3,12 @@
 #include <algorithm>
 #include <string>
 
+#include "engine/sqlite/characters.h"
 #include "engine/sqlite/function_values.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
-
-bool BeginsCharacter(char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }
-
-std::int64_t CharacterCount(std::string_view text) {
-    return static_cast<std::int64_t>(std::count_if(text.begin(), text.end(), BeginsCharacter));
-}
-
-// The byte at which the character with this index, from 0, begins; the size when there are fewer.
-std::size_t ByteOf(std::string_view text, std::int64_t character) {
-    std::size_t at = 0;
-    for (; at < text.size(); ++at)
-        if (BeginsCharacter(text[at]) && character-- == 0) break;
-    return at;
-}
 
 std::string_view Characters(std::string_view text, std::int64_t first, std::int64_t count) {
     text.remove_prefix(ByteOf(text, first));

@@ -1,9 +1,34 @@
 // What SQL text means on the embedded engine, as an application sees it: values compared and stored where SQLite alone
 // would take texts as they stand, what expressions are described as, what definitions say, what is refused.
-#include <algorithm>
-#include <functional>
+#include <atomic>
+#include <cstdlib>
+#include <new>
+#include <ostream>
+#include <tuple>
 
 #include "support/statement_fixture.h"
+
+namespace {
+
+// How many more allocations succeed; -1: all.
+std::atomic<long> allocations_allowed = -1;
+
+void* Allocate(std::size_t size) {
+    long allowed = allocations_allowed;
+    if (allowed == 0) return nullptr;
+    if (allowed > 0) allocations_allowed = allowed - 1;
+    return std::malloc(size > 0 ? size : 1);
+}
+
+}  // namespace
+
+void* operator new(std::size_t size) {
+    void* block = Allocate(size);
+    return block ? block : throw std::bad_alloc();
+}
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept { return Allocate(size); }
+void operator delete(void* block) noexcept { std::free(block); }
+void operator delete(void* block, std::size_t) noexcept { std::free(block); }
 
 namespace {
 
@@ -204,6 +229,234 @@ TEST_F(SqliteMeaning, ValuesAreMadeToFitWhereverTheyAreStored) {
         if (error == 0) error = Execute();
         EXPECT_EQ(error == 0 ? Rows("select id, d, c from w") : "!" + std::to_string(error), c.rows) << sql;
         MustRun("drop table w");
+    }
+}
+
+// What a column of the query is described as, before anything is fetched.
+struct Described {
+    std::string name;
+    int type, size, precision, scale, characters;
+    bool counts_characters;
+};
+bool operator==(const Described& left, const Described& right) {
+    const auto tied = [](const Described& d) {
+        return std::tie(d.name, d.type, d.size, d.precision, d.scale, d.characters, d.counts_characters);
+    };
+    return tied(left) == tied(right);
+}
+std::ostream& operator<<(std::ostream& out, const Described& d) {
+    return out << d.name << " type " << d.type << " size " << d.size << " precision " << d.precision << " scale "
+               << d.scale << " characters " << d.characters << (d.counts_characters ? " counted" : "");
+}
+
+class SqliteDescribes : public SqliteMeaning {
+protected:
+    std::vector<Described> Describe(std::string_view sql, ub4 mode = OCI_DESCRIBE_ONLY) {
+        std::vector<Described> columns;
+        EXPECT_EQ(Prepare(sql), 0);
+        EXPECT_EQ(Execute(0, mode), 0) << sql;
+        const ub4 count = Attribute<ub4>(OCI_ATTR_PARAM_COUNT);
+        for (ub4 position = 1; position <= count; ++position) {
+            dvoid* parameter = nullptr;
+            EXPECT_EQ(OCIParamGet(stmt, OCI_HTYPE_STMT, err, &parameter, position), OCI_SUCCESS);
+            OraText* name = nullptr;
+            ub4 length = 0;
+            EXPECT_EQ(OCIAttrGet(parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, err), OCI_SUCCESS);
+            columns.push_back({std::string(reinterpret_cast<char*>(name), length),
+                               Attribute<ub2>(OCI_ATTR_DATA_TYPE, parameter, OCI_DTYPE_PARAM),
+                               Attribute<ub2>(OCI_ATTR_DATA_SIZE, parameter, OCI_DTYPE_PARAM),
+                               Attribute<ub2>(OCI_ATTR_PRECISION, parameter, OCI_DTYPE_PARAM),
+                               Attribute<sb1>(OCI_ATTR_SCALE, parameter, OCI_DTYPE_PARAM),
+                               Attribute<ub2>(OCI_ATTR_CHAR_SIZE, parameter, OCI_DTYPE_PARAM),
+                               Attribute<ub1>(OCI_ATTR_CHAR_USED, parameter, OCI_DTYPE_PARAM) != 0});
+            OCIDescriptorFree(parameter, OCI_DTYPE_PARAM);
+        }
+        return columns;
+    }
+    int TypeOf(const std::string& expression, const char* from = "t") {
+        const auto columns = Describe("select " + expression + " from " + from);
+        return columns.size() == 1 ? columns[0].type : -1;
+    }
+};
+
+TEST_F(SqliteDescribes, NumbersBeforeTheyAreKnownAndOverNoRows) {
+    MustRun("create table t(a number(5), b varchar2(9), d date)");
+    for (const char* number : {"count(*)", "sum(a)", "a+1", "5", "-a", "1.5e3", "(a * 2)", "a + 1 x", "count(b) as n",
+                               "avg(a) - 1", "length(b)", "count(*) filter (where a > 1)",
+                               "round(a, 2)", "to_number(b) + :x", "sum(a) over (partition by b) c", "a % 2", "max(5)"}) {
+        EXPECT_EQ(TypeOf(number), SQLT_NUM) << number;
+        EXPECT_EQ(Describe(std::string("select ") + number + " from dual, t").size(), 1u);
+    }
+    for (const char* text : {"b", "b || 'x'", "'5'", "1 || 2", "case when a = 1 then 'x' end", "b x", "to_char(a + 1)"})
+        EXPECT_EQ(TypeOf(text), SQLT_CHR) << text;
+    for (const char* date : {"d", "trunc(last_day(d))", "sysdate", "sysdate x", "add_months(d, 1 + 1) as y"})
+        EXPECT_EQ(TypeOf(date), SQLT_DAT) << date;
+    MustRun("create table one(b varchar2(9))");
+    EXPECT_EQ(TypeOf("one.*", "one"), SQLT_CHR);
+}
+
+TEST_F(SqliteDescribes, RowIdsByAnotherName) {
+    MustRun("create table t(a number)");
+    const struct { const char* item; const char* name; int type; } cases[] = {
+        {"rowid", "ROWID", SQLT_RDD}, {"t.rowid", "ROWID", SQLT_RDD}, {"rowid as r", "R", SQLT_RDD},
+        {"rowid r", "R", SQLT_RDD}, {"t.rowid \"Row\"", "Row", SQLT_RDD}};
+    for (const auto& c : cases) {
+        const auto columns = Describe(std::string("select ") + c.item + " from t");
+        ASSERT_EQ(columns.size(), 1u);
+        EXPECT_EQ(columns[0].name, c.name);
+        EXPECT_EQ(columns[0].type, c.type) << c.item;
+    }
+}
+
+TEST_F(SqliteDescribes, NativeFloatsAndDoubles) {
+    MustRun("create table t(f binary_float, d binary_double)");
+    MustRun("insert into t values(16777217, 0.1)");
+    const auto columns = Describe("select f, d, cast(f as binary_double) c from t");
+    ASSERT_EQ(columns.size(), 3u);
+    EXPECT_EQ(columns[0], (Described{"F", SQLT_IBFLOAT, 4, 0, 0, 0, false}));
+    EXPECT_EQ(columns[1], (Described{"D", SQLT_IBDOUBLE, 8, 0, 0, 0, false}));
+    EXPECT_EQ(columns[2].type, SQLT_IBDOUBLE);
+    EXPECT_EQ(Rows("select f, d from t"), "16777216,.1;");
+}
+
+TEST_F(SqliteDescribes, SizesInCharactersAndInBytes) {
+    MustRun("create table t(a varchar2(3), b varchar2(3 byte), c varchar2(3 char), d nvarchar2(3), e char(3), "
+            "f char(3 char), g nchar(3), h nchar)");
+    const Described expected[] = {{"A", SQLT_CHR, 3, 0, 0, 3, false},  {"B", SQLT_CHR, 3, 0, 0, 3, false},
+                                  {"C", SQLT_CHR, 12, 0, 0, 3, true},  {"D", SQLT_CHR, 12, 0, 0, 3, true},
+                                  {"E", SQLT_AFC, 3, 0, 0, 3, false},  {"F", SQLT_AFC, 12, 0, 0, 3, true},
+                                  {"G", SQLT_AFC, 12, 0, 0, 3, true},  {"H", SQLT_AFC, 4, 0, 0, 1, true}};
+    const auto columns = Describe("select * from t");
+    ASSERT_EQ(columns.size(), std::size(expected));
+    for (std::size_t index = 0; index < columns.size(); ++index) EXPECT_EQ(columns[index], expected[index]);
+
+    const struct { const char* column; const char* value; const char* kept; } cases[] = {
+        {"a", "äx", "äx"}, {"a", "äxy", "!12899"}, {"b", "äxy", "!12899"},
+        {"c", "äöü", "äöü"}, {"c", "äöüx", "!12899"}, {"d", "äöü", "äöü"}, {"d", "abcd", "!12899"},
+        {"e", "ä", "ä "}, {"e", "äö", "!12899"}, {"f", "ä", "ä  "}, {"f", "äöü", "äöü"}, {"f", "äöüx", "!12899"},
+        {"g", "ä", "ä  "}, {"g", "äöüx", "!12899"}, {"h", "ä", "ä"}, {"h", "äö", "!12899"}};
+    for (const auto& c : cases) {
+        const std::string column = c.column;
+        for (const bool bound : {true, false}) {
+            MustRun("delete from t");
+            const std::string value = bound ? ":x" : "'" + std::string(c.value) + "'";
+            const sb4 error = RunBound("insert into t(" + column + ") values(" + value + ")", bound ? c.value : nullptr);
+            const std::string kept = error != 0 ? "!" + std::to_string(error) + ";" : Rows("select " + column + " from t");
+            EXPECT_EQ(kept, std::string(c.kept) + ";") << column << ' ' << c.value;
+        }
+    }
+    const struct { const char* cast; const char* text; const char* name; } casts[] = {
+        {"cast('äöü' as varchar2(2))", "ä;", "CAST('äöü' AS VARCHAR2(2))"},
+        {"cast('äöü' as varchar2(3))", "ä;", "CAST('äöü' AS VARCHAR2(3))"},
+        {"cast('äöü' as varchar2(2 char))", "äö;", "CAST('äöü' AS VARCHAR2(2 CHAR))"},
+        {"cast('äöü' as nvarchar2(2))", "äö;", "CAST('äöü' AS NVARCHAR2(2))"},
+        {"cast('ä' as char(3)) || '.'", "ä .;", "CAST('ä' AS CHARACTER(3)) || '.'"},
+        {"cast('ä' as nchar(3)) || '.'", "ä  .;", "CAST('ä' AS NCHAR(3)) || '.'"}};
+    for (const auto& c : casts) {
+        EXPECT_EQ(Rows(std::string("select ") + c.cast + " from dual"), c.text) << c.cast;
+        EXPECT_EQ(Describe(std::string("select ") + c.cast + " from dual")[0].name, c.name);
+    }
+}
+
+TEST_F(SqliteMeaning, FractionsAreRoundedToTheColumnsDigits) {
+    const struct { const char* type; const char* written; const char* kept; } cases[] = {
+        {"timestamp(0)", "2024-02-28 23:59:59.5", "2024-02-29 00:00:00"},
+        {"timestamp(0)", "2024-02-28 23:59:59.499999999", "2024-02-28 23:59:59"},
+        {"timestamp(3)", "2024-12-31 23:59:59.9995", "2025-01-01 00:00:00"},
+        {"timestamp(3)", "2024-01-01 00:00:00.0004999", "2024-01-01 00:00:00"},
+        {"timestamp", "2024-01-01 00:00:00.1234565", "2024-01-01 00:00:00.123457"},
+        {"timestamp(8)", "2024-01-01 00:00:00.123456785", "2024-01-01 00:00:00.12345679"},
+        {"timestamp(9)", "2024-01-01 00:00:00.123456785", "2024-01-01 00:00:00.123456785"},
+        {"timestamp(1) with time zone", "2024-01-01 00:00:00.95 +01:00", "2024-01-01 00:00:01 +01:00"},
+        {"date", "2024-01-01 23:59:59.9", "2024-01-01 23:59:59"},
+        {"timestamp(3)", "9999-12-31 23:59:59.9999", "!1841"}};
+    for (const auto& c : cases) {
+        const std::string literal = "'" + std::string(c.written) + "'";
+        MustRun("create table t(s " + std::string(c.type) + ")");
+        for (const char* sql : {"insert into t values(%)", "insert into t select % from dual",
+                                "insert into t values(timestamp %)", "insert into t select cast(% as $) from dual"}) {
+            MustRun("delete from t");
+            std::string text = With(sql, literal);
+            if (const auto at = text.find('$'); at != std::string::npos) text.replace(at, 1, c.type);
+            const sb4 error = Run(text);
+            EXPECT_EQ(error != 0 ? "!" + std::to_string(error) : Rows("select s || '' as s from t"),
+                      c.kept[0] == '!' ? c.kept : c.kept + std::string(";"))
+                << text << " into " << c.type;
+        }
+        MustRun("drop table t");
+    }
+    MustRun("create table t(s timestamp(0))");
+    MustRun("insert into t values('2024-01-01 00:00:00')");
+    EXPECT_EQ(Rows("select count(*) as n from t where s < '01-JAN-24 12.00.00.4 AM'"), "1;") << "what is compared is not";
+}
+
+TEST_F(SqliteMeaning, DefaultsAreExpressions) {
+    MustRun("create table t(id number, a number default 1 + 1, b date default to_date('09-FEB-24'), "
+            "c date default sysdate not null, d varchar2(9) default 'x' || 'y', e number default -1, "
+            "f date default date '2024-02-09', g number default (2) * 3 check (g < 10))");
+    MustRun("insert into t(id) values(1)");
+    EXPECT_EQ(Rows("select a, d, e, g from t"), "2,xy,-1,6;");
+    EXPECT_EQ(Rows("select b, f, case when c > '01-JAN-20' then 'now' end from t"), "09-FEB-24,09-FEB-24,now;");
+    MustRun("alter table t add h number default 3");
+    EXPECT_EQ(Rows("select h from t"), "3;");
+    EXPECT_EQ(Run("create table u(a varchar2(9) default nobody)"), 900) << "no text without quotes";
+}
+
+TEST_F(SqliteMeaning, OnlyStatementsOfApplicationsReachTheEngine) {
+    MustRun("create table t(a number)");
+    for (const char* sql : {"end", "end transaction", "vacuum", "attach ':memory:' as other", "detach main", "reindex",
+                            "pragma foreign_keys = off", "PRAGMA query_only = 1", "explain pragma query_only = 1", "-- nothing"}) {
+        MustRun("insert into t values(1)");
+        EXPECT_EQ(Run(sql), 900) << sql;
+        MustRun("rollback");
+        EXPECT_EQ(Rows("select count(*) as n from t"), "0;") << sql << " has committed";
+    }
+    MustRun("insert into t values(1)");
+}
+
+TEST_F(SqliteMeaning, TooFewAndTooManyValues) {
+    MustRun("create table t(a number, b number)");
+    EXPECT_EQ(Run("insert into t(a, b) values(1)"), 947);
+    EXPECT_EQ(Run("insert into t(a, b) values(1, 2, 3)"), 913);
+    EXPECT_EQ(Run("insert into t(a, b) select 1 from dual"), 947);
+    EXPECT_EQ(Run("insert into t(a) select 1, 2 from dual"), 913);
+    EXPECT_EQ(Run("insert into t values(1)"), 947);
+    EXPECT_EQ(Run("insert into t values(1, 2, 3)"), 913);
+}
+
+TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
+    const struct { const char* expression; const char* value; } cases[] = {
+        {"months_between(date '2024-02-29', date '2024-01-31')", "1"},    // both last days
+        {"to_char(months_between(date '2024-02-29', date '2024-01-30'), '9.999999')", "  .967742"},
+        {"to_char(months_between(date '2024-03-30', date '2024-02-29'), '9.999999')", " 1.032258"},
+        {"initcap('1st 2ND o''neil')", "1st 2nd O'Neil"},
+        {"instr('abc', 'a', -3)", "1"}, {"instr('abc', 'a', -4)", "0"}, {"instr('abc', 'c', 3)", "3"},
+        {"instr('abc', 'c', 4)", "0"},
+        {"'[' || decode(cast('   ' as char(3)), '   ', 'same') || ']'", "[same]"},
+    };
+    for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.value) << c.expression;
+    MustRun("create table t(c char(3))");
+    MustRun("insert into t select '   ' from dual");
+    EXPECT_EQ(Rows("select '[' || c || ']' as x, length(c) as n from t where c is not null"), "[ ],1;");
+    EXPECT_EQ(Rows("select c from t"), "   ;");
+}
+
+// Memory that stays short from some allocation on, in the middle of the library's SQL functions.
+TEST_F(SqliteMeaning, FunctionWithoutMemoryLeavesTheSessionInOrder) {
+    MustRun("create table t(id number, d date)");
+    MustRun("insert into t values(1, '03-FEB-24')");
+    for (const char* sql : {"select id from t where d > :x || '-24'", "select to_char(d, 'YYYY') || :x as y from t",
+                            "select cast(id || :x as varchar2(9)) as v from t"}) {
+        sb4 answer = 0;
+        for (long allowed = 0; allowed < 200; ++allowed) {
+            ASSERT_EQ(PrepareBound(sql, "01-JAN"), 0);
+            allocations_allowed = allowed;
+            answer = Execute(0);
+            allocations_allowed = -1;
+            EXPECT_EQ(Rows("select 1 as n from dual"), "1;") << sql << " after " << allowed << " allocations";
+            if (answer == 0) break;
+        }
+        EXPECT_EQ(answer, 0) << sql;
     }
 }
 
