@@ -4,6 +4,7 @@
 
 #include "core/command_table.h"
 
+void AddAttributeCommands(HandlerTable& handlers);
 void AddBindCommands(HandlerTable& handlers);
 void AddBufferCommands(HandlerTable& handlers);
 void AddConvenienceCommands(HandlerTable& handlers);
@@ -21,8 +22,10 @@ void AddStatementCommands(HandlerTable& handlers);
 void AddStringCommands(HandlerTable& handlers);
 void AddThreadCommands(HandlerTable& handlers);
 void AddUtilityCommands(HandlerTable& handlers);
+void AddXidCommands(HandlerTable& handlers);
 
 inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
+    AddAttributeCommands,
     AddBindCommands,
     AddBufferCommands,
     AddConvenienceCommands,
@@ -40,4 +43,5 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddStringCommands,
     AddThreadCommands,
     AddUtilityCommands,
+    AddXidCommands,
 };

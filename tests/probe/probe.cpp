@@ -6,11 +6,19 @@
 // handed out ("h1", "h2", ... in the order of making), as a quoted text where a text and its length follow each other
 // or where the text is terminated, as the parts of an XID, or as "pointer".
 //
-// PROBE_ANSWERS names a file of answers, a line each: FUNCTION RESULT [POSITION[+OFFSET]=TYPE:VALUE]...; what stands
-// at POSITION, counted from 1, is an output to fill, OFFSET bytes behind its beginning: TYPE is i1, i2, i4, i8 for
-// integers by width, t for a terminated text, p for a pointer to one, f8 for a double. Answers for a function are used
-// in order, the last one again and again; without any the result is 0. A result of 0 hands out a new object through
-// the first pointer to a pointer; of a function that returns a pointer, 0 is null and anything else a new object.
+// PROBE_ANSWERS names a file of answers, a line each: FUNCTION RESULT followed by any number of
+//
+//   POSITION[+OFFSET]=TYPE:VALUE   what stands at POSITION, counted from 1, is an output to fill, OFFSET bytes behind its
+//                                  beginning: TYPE is i1, i2, i4, i8 for integers by width, f8 for a double, t for a
+//                                  terminated text, b for bytes in hexadecimal, p and x for a pointer to such a text and
+//                                  such bytes, h for a pointer to a new object
+//   POSITION?TYPE                  records what stands at POSITION: i1 to i8; tN, N characters; p, the text or texts
+//                                  that pointers there lead to, up to a null pointer
+//   call:KIND:ARGUMENT...          calls what the driver has installed and records what it gave (CallBack says how)
+//
+// Answers for a function are used in order, the last one again and again; without any the result is 0. A result of 0
+// hands out a new object through the first pointer to a pointer; of a function that returns a pointer, 0 is null and
+// anything else a new object.
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
@@ -41,6 +49,21 @@ struct Output {
 struct Answer {
     long long result = 0;
     std::vector<Output> outputs;
+    std::vector<Output> shown;  // of which the type alone counts
+    std::vector<std::vector<std::string>> callbacks;
+};
+
+// Callbacks of the driver, the last of each kind, and their contexts.
+struct Installed {
+    void* in_context = nullptr;
+    OCICallbackInBind in = nullptr;
+    void* out_context = nullptr;
+    OCICallbackOutBind out = nullptr;
+    void* define_context = nullptr;
+    OCICallbackDefine define = nullptr;
+    void* lob_context = nullptr;
+    OCICallbackLobRead read = nullptr;
+    OCICallbackLobWrite write = nullptr;
 };
 
 // One argument as the call passed it.
@@ -55,13 +78,29 @@ struct State {
     std::map<std::string, std::deque<Answer>> answers;
     std::map<const void*, size_t> objects;
     std::deque<std::vector<char>> memory;
+    Installed installed;
     std::FILE* log = nullptr;    // null: standard output
 };
+
+std::vector<std::string> Split(const std::string& text) {
+    std::vector<std::string> parts;
+    std::istringstream rest(text);
+    for (std::string part; std::getline(rest, part, ':');) parts.push_back(part);
+    return parts;
+}
 
 Answer ReadAnswer(std::istringstream& words) {
     Answer answer;
     words >> answer.result;
     for (std::string word; words >> word;) {
+        if (word.starts_with("call:")) {
+            answer.callbacks.push_back(Split(word.substr(5)));
+            continue;
+        }
+        if (const size_t mark = word.find('?'); mark != std::string::npos && word.find('=') == std::string::npos) {
+            answer.shown.push_back({std::stoul(word), 0, word.substr(mark + 1), ""});
+            continue;
+        }
         const size_t equals = word.find('=');
         const size_t colon = word.find(':', equals);
         if (colon == std::string::npos) {
@@ -144,6 +183,17 @@ void AppendArgument(State& state, std::string& line, const Argument& argument, c
     }
 }
 
+void Print(State& state, const std::string& line) {
+    std::FILE* const log = state.log ? state.log : stdout;
+    std::fputs(line.c_str(), log);
+    std::fflush(log);
+}
+
+template <class Value>
+void Store(const void* place, Value value) {
+    std::memcpy(const_cast<void*>(place), &value, sizeof value);
+}
+
 void Record(State& state, const char* function, const std::vector<Argument>& arguments, long long result) {
     std::string line = std::string("    probe: ") + function + "(";
     for (size_t index = 0; index < arguments.size(); ++index) {
@@ -151,9 +201,157 @@ void Record(State& state, const char* function, const std::vector<Argument>& arg
         AppendArgument(state, line, arguments[index], index + 1 < arguments.size() ? &arguments[index + 1] : nullptr);
     }
     line += ") = " + std::to_string(result) + "\n";
-    std::FILE* const log = state.log ? state.log : stdout;
-    std::fputs(line.c_str(), log);
-    std::fflush(log);
+    Print(state, line);
+}
+
+template <class Value> Value Load(const void* place) {
+    Value value;
+    std::memcpy(&value, place, sizeof value);
+    return value;
+}
+
+// What an argument points to, as a test asked for it.
+void Show(State& state, const Output& shown, const std::vector<Argument>& arguments) {
+    const void* const place = arguments.at(shown.position - 1).address;
+    std::string line = "    probe: " + std::to_string(shown.position) + " is ";
+    if (!place) line += "null";
+    else if (shown.type == "i1") line += std::to_string(Load<signed char>(place));
+    else if (shown.type == "i2") line += std::to_string(Load<short>(place));
+    else if (shown.type == "i4") line += std::to_string(Load<int>(place));
+    else if (shown.type == "i8") line += std::to_string(Load<long long>(place));
+    else if (shown.type[0] == 't') AppendText(line, place, std::stoll(shown.type.substr(1)));
+    else for (auto* text = static_cast<const char* const*>(place); *text; ++text)
+        AppendText(line, *text, static_cast<long long>(std::strlen(*text)));
+    Print(state, line + "\n");
+}
+
+// --- Callbacks ------------------------------------------------------------------------------------------------------
+
+template <class... Arguments> std::string Numbers(Arguments... arguments) {
+    std::string text;
+    ((text += (text.empty() ? "" : ", ") + std::to_string(arguments)), ...);
+    return text;
+}
+
+// in:ITERATION:INDEX asks for a value to bind.
+void CallIn(State& state, const std::vector<std::string>& words) {
+    const Installed& installed = state.installed;
+    void* data = nullptr;
+    ub4 length = 0;
+    ub1 piece = 0;
+    void* indicator = nullptr;
+    const auto iteration = static_cast<ub4>(std::stoul(words[1]));
+    const auto index = static_cast<ub4>(std::stoul(words[2]));
+    const sb4 rc = installed.in(installed.in_context, nullptr, iteration, index, &data, &length, &piece, &indicator);
+    std::string line = "    probe: in callback " + Numbers(iteration, index) + " = " + std::to_string(rc);
+    if (rc == OCI_CONTINUE) {
+        line += ": piece " + std::to_string(piece) + ", ";
+        AppendText(line, data, data ? length : 0);
+        if (indicator) line += ", indicator " + std::to_string(Load<short>(indicator));
+    }
+    Print(state, line + "\n");
+}
+
+// What a callback that receives has given places for; `text` is put there as far as it fits.
+void Deliver(State& state, std::string line, sb4 rc, void* data, ub4* length, ub1 piece, void* indicator, ub2* code,
+             const std::string& text) {
+    line += " = " + std::to_string(rc);
+    if (rc == OCI_CONTINUE && data && length) {
+        line += ": piece " + std::to_string(piece) + ", room " + std::to_string(*length);
+        *length = std::min(*length, static_cast<ub4>(text.size()));
+        std::memcpy(data, text.data(), *length);
+        if (indicator) Store(indicator, short{0});
+        if (code) *code = 0;
+    }
+    Print(state, line + "\n");
+}
+
+// out:ITERATION:INDEX:PIECE:TEXT delivers a piece to a bind, define:ITERATION:PIECE:TEXT one to a define.
+void CallOut(State& state, const std::vector<std::string>& words) {
+    const Installed& installed = state.installed;
+    void *data = nullptr, *indicator = nullptr;
+    ub4* length = nullptr;
+    ub2* code = nullptr;
+    const auto iteration = static_cast<ub4>(std::stoul(words[1]));
+    const auto index = static_cast<ub4>(std::stoul(words[2]));
+    auto piece = static_cast<ub1>(std::stoul(words[3]));
+    const sb4 rc = installed.out(installed.out_context, nullptr, iteration, index, &data, &length, &piece, &indicator,
+                                 &code);
+    Deliver(state, "    probe: out callback " + Numbers(iteration, index), rc, data, length, piece, indicator, code,
+            words[4]);
+}
+
+void CallDefine(State& state, const std::vector<std::string>& words) {
+    const Installed& installed = state.installed;
+    void *data = nullptr, *indicator = nullptr;
+    ub4* length = nullptr;
+    ub2* code = nullptr;
+    const auto iteration = static_cast<ub4>(std::stoul(words[1]));
+    auto piece = static_cast<ub1>(std::stoul(words[2]));
+    const sb4 rc = installed.define(installed.define_context, nullptr, iteration, &data, &length, &piece, &indicator,
+                                    &code);
+    Deliver(state, "    probe: define callback " + Numbers(iteration), rc, data, length, piece, indicator, code,
+            words[3]);
+}
+
+std::string Bytes(const std::string& digits) {
+    std::string bytes;
+    for (size_t index = 0; index + 1 < digits.size(); index += 2)
+        bytes += static_cast<char>(std::stoi(digits.substr(index, 2), nullptr, 16));
+    return bytes;
+}
+
+// read:PIECE:BYTES delivers a piece of a LOB, write:ROOM asks for one.
+void CallRead(State& state, const std::vector<std::string>& words) {
+    const std::string bytes = Bytes(words.size() > 2 ? words[2] : "");
+    const sb4 rc = state.installed.read(state.installed.lob_context, bytes.data(), static_cast<ub4>(bytes.size()),
+                                        static_cast<ub1>(std::stoul(words[1])));
+    Print(state, "    probe: read callback = " + std::to_string(rc) + "\n");
+}
+
+void CallWrite(State& state, const std::vector<std::string>& words) {
+    std::vector<char> room(std::stoul(words[1]));
+    auto length = static_cast<ub4>(room.size());
+    ub1 piece = 255;
+    const sb4 rc = state.installed.write(state.installed.lob_context, room.data(), &length, &piece);
+    std::string line = "    probe: write callback = " + std::to_string(rc) + ": piece " + std::to_string(piece) + ", ";
+    AppendText(line, room.data(), std::min<long long>(length, static_cast<long long>(room.size())));
+    Print(state, line + "\n");
+}
+
+void CallBack(State& state, const std::vector<std::string>& words) {
+    const Installed& installed = state.installed;
+    const std::string& kind = words[0];
+    if (kind == "in" && installed.in) CallIn(state, words);
+    else if (kind == "out" && installed.out) CallOut(state, words);
+    else if (kind == "define" && installed.define) CallDefine(state, words);
+    else if (kind == "read" && installed.read) CallRead(state, words);
+    else if (kind == "write" && installed.write) CallWrite(state, words);
+    else Print(state, "    probe: no " + kind + " callback\n");
+}
+
+// What calls install. No function but these has such arguments.
+template <class... Parameters> void Install(State&, Parameters...) {}
+void Install(State& state, OCIBind*, OCIError*, void* in_context, OCICallbackInBind in, void* out_context,
+             OCICallbackOutBind out) {
+    state.installed.in_context = in_context;
+    state.installed.in = in;
+    state.installed.out_context = out_context;
+    state.installed.out = out;
+}
+void Install(State& state, OCIDefine*, OCIError*, void* context, OCICallbackDefine define) {
+    state.installed.define_context = context;
+    state.installed.define = define;
+}
+void Install(State& state, OCISvcCtx*, OCIError*, OCILobLocator*, ub4*, ub4, void*, ub4, void* context,
+             OCICallbackLobRead read, ub2, ub1) {
+    state.installed.lob_context = context;
+    state.installed.read = read;
+}
+void Install(State& state, OCISvcCtx*, OCIError*, OCILobLocator*, ub4*, ub4, void*, ub4, ub1,
+             void* context, OCICallbackLobWrite write, ub2, ub1) {
+    state.installed.lob_context = context;
+    state.installed.write = write;
 }
 
 void* MakeObject(State& state) {
@@ -173,18 +371,13 @@ void HandOut(State& state, const std::vector<Argument>& arguments) {
     }
 }
 
-template <class Value>
-void Store(const void* place, Value value) {
-    std::memcpy(const_cast<void*>(place), &value, sizeof value);
-}
-
 // A copy that stays where it is.
 const char* KeepText(const std::string& text) {
     static auto* const kept = new std::deque<std::string>;
     return kept->emplace_back(text).c_str();
 }
 
-void Fill(const Output& output, const std::vector<Argument>& arguments) {
+void Fill(State& state, const Output& output, const std::vector<Argument>& arguments) {
     if (output.position == 0 || output.position > arguments.size()) return;
     const auto* place = static_cast<const char*>(arguments[output.position - 1].address);
     if (!place) return;
@@ -195,6 +388,9 @@ void Fill(const Output& output, const std::vector<Argument>& arguments) {
     else if (output.type == "i8") Store(place, std::stoll(output.value));
     else if (output.type == "f8") Store(place, std::stod(output.value));
     else if (output.type == "p") Store(place, KeepText(output.value));
+    else if (output.type == "x") Store(place, KeepText(Bytes(output.value)));
+    else if (output.type == "h") Store(place, MakeObject(state));
+    else if (output.type == "b") std::memcpy(const_cast<char*>(place), KeepText(Bytes(output.value)), output.value.size() / 2);
     else std::memcpy(const_cast<char*>(place), output.value.c_str(), output.value.size() + 1);
 }
 
@@ -241,8 +437,11 @@ struct Entry<Result(Parameters...), kIndex> {
         // An array of XIDs is there to be filled.
         if (sizeof...(Parameters) > 3 && arguments[0].form == Argument::xid) arguments[0].form = Argument::pointer;
         Record(state, kNames[kIndex], arguments, answer.result);
+        for (const Output& shown : answer.shown) Show(state, shown, arguments);
+        Install(state, parameters...);
+        for (const auto& words : answer.callbacks) CallBack(state, words);
         if (answer.result == 0) HandOut(state, arguments);
-        for (const Output& output : answer.outputs) Fill(output, arguments);
+        for (const Output& output : answer.outputs) Fill(state, output, arguments);
         if constexpr (std::is_pointer_v<Result>)
             return answer.result ? static_cast<Result>(MakeObject(state)) : nullptr;
         else if constexpr (!std::is_void_v<Result>) return static_cast<Result>(answer.result);

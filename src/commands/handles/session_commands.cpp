@@ -51,14 +51,9 @@ constexpr HandleCall kHandleCalls[] = {
 struct LogonTexts {
     TextArgument user, password, server;
 
-    bool Set(char** words) { return user.SetWords(words) && SetPassword(words + 2) && server.SetWords(words + 4); }
-
-private:
-    // The start-up password stands in for any but "null"; a length of 0 stays 0.
-    bool SetPassword(char** words) {
-        if (!replace_password || IsNull(words[0])) return password.SetWords(words);
-        const auto length = DecodeLong(words[1]) == 0 ? 0L : static_cast<long>(start_up_password.size());
-        return password.Set(start_up_password.c_str(), length, TextArea::four_times);
+    bool Set(char** words) {
+        return user.SetWords(words) && SetPassword(password, words[2], DecodeLong(words[3])) &&
+               server.SetWords(words + 4);
     }
 };
 

@@ -7,6 +7,7 @@
 #include <cstring>
 
 #include "core/keywords.h"
+#include "core/state.h"
 #include "objects/registry.h"
 #include "objects/text_conversion.h"
 #include "oci.h"
@@ -78,6 +79,12 @@ public:
     NamedObject* Enter(Kind kind, void* parent) const {
         return std::strcmp(name_, "-1") == 0 ? nullptr : Register(kind, name_, object_, parent);
     }
+    // The same under a name that may be taken: the new object stands for it from now on.
+    NamedObject* EnterAnew(Kind kind, void* parent) const {
+        NamedObject* const old = FindByName(kind, name_);
+        if (old != nullptr) old->in_use = false;
+        return Enter(kind, parent);
+    }
 
 private:
     const char* name_;
@@ -122,6 +129,12 @@ inline bool SetTextWord(TextArgument& text, const char* word, long length) {
 // The text at words[0], its length at words[1].
 inline bool SetTextWords(TextArgument& text, char** words) {
     return SetTextWord(text, words[0], DecodeLong(words[1]));
+}
+// A password: the start-up password stands in for any but "null", where that was asked for; a length of 0 stays 0.
+inline bool SetPassword(TextArgument& password, const char* word, long length) {
+    if (!replace_password || IsNull(word)) return password.Set(word, length, TextArea::four_times);
+    const auto own_length = length == 0 ? 0L : static_cast<long>(start_up_password.size());
+    return password.Set(start_up_password.c_str(), own_length, TextArea::four_times);
 }
 // A text that the library takes up to its closing zero.
 inline bool SetClosedText(TextArgument& text, const char* word) {

@@ -12,9 +12,9 @@
 
 namespace {
 
-// Enters a bind or define under the statement that words[1] names.
+// Enters a bind or define under the statement that words[1] names. A name that is taken is entered anew.
 template <Kind kKind, class T> void EnterOnStatement(const NewObject<T>& object, OCIStmt* statement, char** words) {
-    auto* const slot = AsRecord<kKind>(object.Enter(kKind, ParentOf(Kind::stmt, words[1])));
+    auto* const slot = AsRecord<kKind>(object.EnterAnew(kKind, ParentOf(Kind::stmt, words[1])));
     if (slot != nullptr) slot->statement = statement;
 }
 
@@ -92,13 +92,6 @@ ub4* CurrentElement(const BindForm& form, char** words, const DataTarget& target
     return target.current_element;
 }
 
-// A name that is taken is entered anew.
-void EnterBind(const NewObject<OCIBind>& object, OCIStmt* statement, char** words) {
-    NamedObject* const old = FindByName(Kind::bind, words[2]);
-    if (old != nullptr) old->in_use = false;
-    EnterOnStatement<Kind::bind>(object, statement, words);
-}
-
 void RunBind(const Bind& row, int count, char** words) {
     const BindForm& form = row.FormOf(count);
     CheckInUse(Kind::bind, words[2]);  // a warning, no more
@@ -115,7 +108,8 @@ void RunBind(const Bind& row, int count, char** words) {
     bind.mode = DecodeStatementMode(words[form.mode], BindModeKeywords);
     const sword rc = row.call(object.Place(), placeholder, bind);
     TraceAndReport(row.code, words[1], bind.error, rc);
-    if (rc == OCI_SUCCESS && object.Place() != nullptr) EnterBind(object, bind.statement, words);
+    if (rc == OCI_SUCCESS && object.Place() != nullptr)
+        EnterOnStatement<Kind::bind>(object, bind.statement, words);
 }
 
 constexpr Bind kBinds[] = {
