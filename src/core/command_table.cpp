@@ -19,9 +19,11 @@ namespace {
 
 // Codes are places in tables: none stands for two commands, none is beyond what tables are made for.
 constexpr bool CodesAreSound() {
-    for (const Code& code : kCommandCodes) {
-        if (static_cast<int>(code) <= 0 || static_cast<int>(code) >= kCodeLimit) return false;
-        if (std::ranges::count(kCommandCodes, code) != 1) return false;
+    bool taken[kCodeLimit] = {};
+    for (const Code code : kCommandCodes) {
+        const int place = static_cast<int>(code);
+        if (place <= 0 || place >= kCodeLimit || taken[place]) return false;
+        taken[place] = true;
     }
     return true;
 }
