@@ -20,6 +20,7 @@ void AddRowidCommands(HandlerTable& handlers);
 void AddSessionCommands(HandlerTable& handlers);
 void AddStatementCommands(HandlerTable& handlers);
 void AddStringCommands(HandlerTable& handlers);
+void AddStructCommands(HandlerTable& handlers);
 void AddThreadCommands(HandlerTable& handlers);
 void AddUtilityCommands(HandlerTable& handlers);
 void AddXidCommands(HandlerTable& handlers);
@@ -41,6 +42,7 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddSessionCommands,
     AddStatementCommands,
     AddStringCommands,
+    AddStructCommands,
     AddThreadCommands,
     AddUtilityCommands,
     AddXidCommands,

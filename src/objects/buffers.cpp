@@ -2,6 +2,7 @@
 #include "objects/buffers.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <utility>
 
 #include "core/keywords.h"
@@ -39,25 +40,42 @@ bool ObtainBlocks(MemBuffer& buffer) {
            Obtain(buffer.return_codes, halves, "Could not allocate memory for length rcode\n");
 }
 
-// Number buffers start as zeros of their type; the first that cannot be made ends it.
-bool SetZero(const MemBuffer& buffer, unsigned char* element) {
-    if (buffer.type == SQLT_PDN)
-        return TextToDecimal(kZeroText, element, buffer.precision, buffer.scale) == kDecimalDone;
-    OCINumber zero;
-    if (NumberFromText(kZeroText, zero) != OCI_SUCCESS) return false;
-    std::copy_n(zero.OCINumberPart, sizeof zero, element);
-    return true;
-}
-
-void InitialiseNumbers(const MemBuffer& buffer) {
-    if (buffer.type != SQLT_NUM && buffer.type != SQLT_VNU && buffer.type != SQLT_PDN) return;
+// The first zero that cannot be made ends it.
+void InitialiseNumbers(const MemBuffer& buffer, const ElementShape& shape) {
     for (uint32_t index = 0; index < buffer.array_size; ++index)
-        if (!SetZero(buffer, buffer.Element(index))) return;
+        if (!SetZero(shape, buffer.Element(index))) return;
 }
 
 void NoteUse(const MemBuffer& buffer) {
     for (size_t slot = used_slots; slot < std::size(buffers); ++slot)
         if (&buffers[slot] == &buffer) used_slots = slot + 1;
+}
+
+// A record as a new one begins, without its blocks.
+void BeginRecord(MemBuffer& buffer, void* statement, const ElementShape& shape, uint32_t array_size) {
+    NoteUse(buffer);
+    buffer.statement = statement;
+    buffer.data = nullptr;
+    buffer.call_data = nullptr;
+    buffer.element_size = buffer.call_length = buffer.created_size = shape.size;
+    buffer.created_type = buffer.type = static_cast<uint16_t>(shape.type);
+    buffer.precision = shape.precision;
+    buffer.scale = shape.scale;
+    buffer.indicators = buffer.call_indicators = nullptr;
+    buffer.lengths = buffer.call_lengths = nullptr;
+    buffer.return_codes = buffer.call_return_codes = nullptr;
+    buffer.array_size = array_size;
+    buffer.dynamic = {};
+    buffer.holds_pointers = false;
+    buffer.current_element = 0;
+    buffer.viewed = nullptr;
+}
+
+void SetCallPointers(MemBuffer& buffer) {
+    buffer.call_data = buffer.data;
+    buffer.call_indicators = buffer.indicators;
+    buffer.call_lengths = buffer.lengths;
+    buffer.call_return_codes = buffer.return_codes;
 }
 
 template <class T> void FreeBlock(T*& block) {
@@ -107,34 +125,57 @@ uint32_t ElementSize(int type, uint32_t given, uint32_t precision) {
     }
 }
 
-int AllocateBuffer(MemBuffer& buffer, void* statement, uint32_t element_size, uint32_t array_size, int type,
-                   uint16_t precision, int16_t scale) {
-    NoteUse(buffer);
-    buffer.statement = statement;
-    buffer.data = nullptr;
-    buffer.call_data = nullptr;
-    buffer.element_size = buffer.call_length = buffer.created_size = element_size;
-    buffer.created_type = buffer.type = static_cast<uint16_t>(type);
-    buffer.precision = precision;
-    buffer.scale = scale;
-    buffer.indicators = buffer.call_indicators = nullptr;
-    buffer.lengths = buffer.call_lengths = nullptr;
-    buffer.return_codes = buffer.call_return_codes = nullptr;
-    buffer.array_size = array_size;
-    buffer.dynamic = {};
-    buffer.holds_pointers = false;
-    buffer.current_element = 0;
+ElementShape ReadElementShape(int type, const char* size_word) {
+    char* end = nullptr;
+    const auto given = static_cast<uint32_t>(std::strtol(size_word, &end, 10));
+    ElementShape shape{.type = type};
+    if (type == SQLT_PDN) {
+        shape.precision = static_cast<uint16_t>(given);
+        shape.scale = static_cast<int16_t>(*end == '\0' ? 0 : DecodeLong(end + 1));
+    }
+    shape.size = ElementSize(type, given, shape.precision);
+    return shape;
+}
+
+bool SetZero(const ElementShape& shape, unsigned char* element) {
+    if (shape.type == SQLT_PDN) return TextToDecimal(kZeroText, element, shape.precision, shape.scale) == kDecimalDone;
+    if (shape.type != SQLT_NUM && shape.type != SQLT_VNU) return true;
+    OCINumber zero;
+    if (NumberFromText(kZeroText, zero) != OCI_SUCCESS) return false;
+    std::copy_n(zero.OCINumberPart, sizeof zero, element);
+    return true;
+}
+
+int AllocateBuffer(MemBuffer& buffer, void* statement, const ElementShape& shape, uint32_t array_size) {
+    BeginRecord(buffer, statement, shape, array_size);
+    buffer.value_stride = shape.size;
+    buffer.field_stride = sizeof(uint16_t);
     if (!ObtainBlocks(buffer)) return -1;
-    buffer.call_data = buffer.data;
-    buffer.call_indicators = buffer.indicators;
-    buffer.call_lengths = buffer.lengths;
-    buffer.call_return_codes = buffer.return_codes;
-    InitialiseNumbers(buffer);
-    buffer.holds_pointers = HoldsPointers(type);
+    SetCallPointers(buffer);
+    InitialiseNumbers(buffer, shape);
+    buffer.holds_pointers = HoldsPointers(shape.type);
     return 0;
 }
 
+void ShowAsBuffer(MemBuffer& buffer, void* statement, const ElementShape& shape, uint32_t array_size,
+                  const ViewPlaces& places, uint32_t stride) {
+    BeginRecord(buffer, statement, shape, array_size);
+    buffer.value_stride = buffer.field_stride = stride;
+    buffer.data = places.value;
+    buffer.indicators = places.indicator;
+    buffer.lengths = places.length;
+    buffer.return_codes = places.return_code;
+    SetCallPointers(buffer);
+    buffer.holds_pointers = HoldsPointers(shape.type);
+}
+
 void FreeBufferBlocks(MemBuffer& buffer) {
+    if (buffer.viewed != nullptr) {
+        buffer.viewed = nullptr;
+        buffer.data = nullptr;
+        buffer.indicators = nullptr;
+        buffer.lengths = buffer.return_codes = nullptr;
+    }
     FreeBlock(buffer.data);
     FreeBlock(buffer.indicators);
     FreeBlock(buffer.lengths);

@@ -12,6 +12,7 @@
 inline constexpr size_t kElementSlack = 64;
 
 struct MemBuffer;
+struct MemStruct;
 
 // What dynamic binds and defines keep with a buffer. The three blocks are the buffer's own, null until one is needed.
 struct DynamicData {
@@ -46,9 +47,24 @@ struct MemBuffer {
     uint32_t current_element;   // of PL/SQL arrays: the count that calls read and write
     DynamicData dynamic;
 
-    unsigned char* Element(uint32_t index) const { return data + size_t{index} * element_size; }
+    // A view shows one member of a struct as a buffer: all blocks above but the dynamic ones are the struct's, and its
+    // elements lie a row apart. Freeing the struct ends it.
+    const MemStruct* viewed;    // null: no view
+    uint32_t viewed_member;
+    uint32_t value_stride;      // bytes from one element to the next,
+    uint32_t field_stride;      // and from one indicator, length or return code
+
+    unsigned char* Element(uint32_t index) const { return data + size_t{index} * value_stride; }
+    int16_t* Indicator(uint32_t index) const { return Field(indicators, index); }
+    uint16_t* Length(uint32_t index) const { return Field(lengths, index); }
+    uint16_t* ReturnCode(uint32_t index) const { return Field(return_codes, index); }
     // False when an allocation has failed half-way: elements must not be touched then.
     bool Complete() const { return data && indicators && lengths && return_codes; }
+
+private:
+    template <class T> T* Field(T* first, uint32_t index) const {
+        return reinterpret_cast<T*>(reinterpret_cast<char*>(first) + size_t{index} * field_stride);
+    }
 };
 
 std::span<MemBuffer> Buffers();
@@ -58,15 +74,37 @@ MemBuffer* FindBuffer(const char* name);
 // The same without any message.
 MemBuffer* FindBufferQuietly(const char* name);
 
-// The size of one element of the type when `given` was asked for. Precision and scale are used for packed decimal only.
+// What an element is made as. Precision and scale are those of packed decimal only.
+struct ElementShape {
+    int type = 0;
+    uint32_t size = 0;
+    uint16_t precision = 0;
+    int16_t scale = 0;
+};
+// The shape that a type and the word for its size ask for: a number, but "precision,scale" for packed decimal. Without
+// a comma the scale is 0.
+ElementShape ReadElementShape(int type, const char* size_word);
+
+// The size of one element of the type when `given` was asked for.
 uint32_t ElementSize(int type, uint32_t given, uint32_t precision);
+
+// Makes an element of a number type zero; those of other types stay as they are. False when that failed.
+bool SetZero(const ElementShape& shape, unsigned char* element);
 
 // Whether elements of the type hold a pointer.
 bool HoldsPointers(int type);
 
 // Allocates the blocks and fills the record as a new buffer. Returns 0, or -1 after a failed allocation, which has been
 // complained about; blocks already there stay attached.
-int AllocateBuffer(MemBuffer& buffer, void* statement, uint32_t element_size, uint32_t array_size, int type,
-                   uint16_t precision, int16_t scale);
-// Frees all blocks and nulls all pointers; the slot itself is the caller's.
+int AllocateBuffer(MemBuffer& buffer, void* statement, const ElementShape& shape, uint32_t array_size);
+// Makes the record of a view: the addresses are of its first element, `stride` bytes lead to the next.
+struct ViewPlaces {
+    unsigned char* value;
+    int16_t* indicator;
+    uint16_t* length;
+    uint16_t* return_code;
+};
+void ShowAsBuffer(MemBuffer& buffer, void* statement, const ElementShape& shape, uint32_t array_size,
+                  const ViewPlaces& places, uint32_t stride);
+// Frees all blocks that are the buffer's own and nulls all pointers; the slot itself is the caller's.
 void FreeBufferBlocks(MemBuffer& buffer);

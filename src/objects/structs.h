@@ -1,16 +1,16 @@
 // Memory structs: named arrays of rows; a row holds, for each member in turn, its value area, indicator, length and
-// return code.
+// return code, each aligned as its type needs. Members can be seen as buffers, too: a view is an entry of the buffer
+// table under the struct's name, "$$" and the member's index.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 #include <span>
 
+#include "objects/buffers.h"
+
 struct StructMember {
-    uint16_t type;
-    uint32_t size;             // of the value area
-    uint16_t precision;        // packed decimal only
-    int16_t scale;
+    ElementShape shape;
     uint32_t value_offset;     // all four from the start of the row
     uint32_t indicator_offset;
     uint32_t length_offset;
@@ -28,17 +28,38 @@ struct MemStruct {
     StructMember* members;
     uint32_t member_count;
 
+    std::span<const StructMember> Members() const { return {members, member_count}; }
     unsigned char* Row(uint32_t index) const { return rows + size_t{index} * row_size; }
 };
 
 std::span<MemStruct> Structs();
 
+// Lays the members out and allocates the rows, numbers as zeros and all else zero-filled. False after a failed
+// allocation, which has been complained about: the record then owns nothing.
+bool AllocateStruct(MemStruct& record, void* statement, std::span<const ElementShape> members, uint32_t array_size);
+// Frees the blocks and the views; the slot itself is the caller's.
+void FreeStructBlocks(MemStruct& record);
+// Moves the struct and its views to another statement.
+void MoveToStatement(MemStruct& record, void* statement);
+
 // "Struct %s not found\n" (nothing for "null") and null when there is none.
 MemStruct* FindStruct(const char* name);
 
+// Where the parts of a member lie in a row.
+ViewPlaces PlacesOf(const MemStruct& record, const StructMember& member, uint32_t row);
+
 // The member that a bind or define uses. An index not below the count prints "Invalid index into struct - %ld\n", a
-// struct without rows "Invalid array index into struct - %ld\n"; both give null.
-StructMember* SelectMember(MemStruct& record, long index);
+// struct without the row "Invalid array index into struct - %ld\n"; both give null.
+StructMember* SelectMember(MemStruct& record, long index, long row = 0);
+
+// The view of a member, found or made. Null when the buffer table is full, which has been said.
+MemBuffer* ViewOf(MemStruct& record, const StructMember& member);
+
+// The buffer that dynamic commands name: a buffer, a view by its name (made when it is not there yet), or a struct and
+// the index of a member. Null when the command ends here, with the messages of FindDataTarget.
+MemBuffer* FindDynamicBuffer(const char* word, long member);
+// The same for a word that must not be a struct, and without any message.
+MemBuffer* FindBufferOrView(const char* word);
 
 // What a bind or define passes to the library for one value, whichever of the two supplies it.
 struct DataTarget {

@@ -259,7 +259,7 @@ constexpr DisplayIndex kDisplayIndex;
 
 uint32_t LengthOf(const MemBuffer& buffer, uint32_t index) {
     const DynamicData& dynamic = buffer.dynamic;
-    if (dynamic.lengths_count == 0) return buffer.lengths[index];
+    if (dynamic.lengths_count == 0) return *buffer.Length(index);
     const uint32_t previous = dynamic.previous_lengths == nullptr ? 0 : dynamic.previous_lengths[index];
     return previous + (dynamic.piece_lengths == nullptr ? 0 : dynamic.piece_lengths[index]);
 }
@@ -287,8 +287,8 @@ ElementView ElementOf(const MemBuffer& buffer, uint32_t index, bool utf16) {
     return {.type = buffer.type,
             .data = buffer.Element(index),
             .size = buffer.element_size,
-            .indicator = buffer.indicators[index],
-            .return_code = buffer.return_codes[index],
+            .indicator = *buffer.Indicator(index),
+            .return_code = *buffer.ReturnCode(index),
             .length = LengthOf(buffer, index),
             .precision = buffer.precision,
             .scale = buffer.scale,

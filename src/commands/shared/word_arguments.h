@@ -43,6 +43,15 @@ inline void* ParentOf(Kind kind, const char* name) {
     return slot == nullptr ? nullptr : slot->parent;
 }
 
+// The statement that a buffer or struct belongs to; "null" is none. False when the command ends here: an unknown name,
+// which has been complained about.
+inline bool ResolveOwner(const char* word, void*& statement) {
+    statement = IsInvalid(word) ? InvalidObject() : nullptr;
+    if (statement != nullptr || FindObject(Kind::stmt, word, statement) || IsNull(word)) return true;
+    Message(kError, "Handle %s not found\n", word);
+    return false;
+}
+
 // An object of the first kind, else whatever the word stands for in the second.
 inline void* ResolveEither(Kind first, Kind second, const char* name) {
     void* object = nullptr;

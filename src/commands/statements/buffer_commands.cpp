@@ -4,6 +4,7 @@
 #include <cstring>
 
 #include "commands/families.h"
+#include "commands/shared/word_arguments.h"
 #include "core/keywords.h"
 #include "core/messages.h"
 #include "core/state.h"
@@ -16,66 +17,31 @@
 
 namespace {
 
-// The statement that a buffer belongs to. False when the command ends: an unknown name, which has been complained
-// about.
-bool ResolveStatement(const char* word, void*& statement) {
-    statement = IsInvalid(word) ? InvalidObject() : nullptr;
-    if (statement != nullptr || FindObject(Kind::stmt, word, statement) || IsNull(word)) return true;
-    Message(kError, "Handle %s not found\n", word);
-    return false;
-}
-
 // --- Making and freeing --------------------------------------------------------------------------------------------
 
-// What a buffer's words ask for.
-struct Request {
-    void* statement;
-    int type;
-    uint32_t element_size;
-    uint32_t array_size;
-    uint16_t precision = 0;
-    int16_t scale = 0;
-
-    void ReadSize(const char* word);
-};
-
-// A number, but "precision,scale" for packed decimal. Without a comma the scale is 0.
-void Request::ReadSize(const char* word) {
-    char* end = nullptr;
-    const auto given = static_cast<uint32_t>(std::strtol(word, &end, 10));
-    if (type == SQLT_PDN) {
-        precision = static_cast<uint16_t>(given);
-        scale = static_cast<int16_t>(*end == '\0' ? 0 : DecodeLong(end + 1));
-    }
-    element_size = ElementSize(type, given, precision);
-}
-
-int AllocateNameless(const Request& request) {
+int AllocateNameless(void* statement, const ElementShape& shape, uint32_t array_size) {
     MemBuffer buffer{};
-    const int rc = AllocateBuffer(buffer, request.statement, request.element_size, request.array_size, request.type,
-                                  request.precision, request.scale);
+    const int rc = AllocateBuffer(buffer, statement, shape, array_size);
     FreeBufferBlocks(buffer);
     return rc;
 }
 
-int AllocateNamed(const char* name, const Request& request) {
+int AllocateNamed(const char* name, void* statement, const ElementShape& shape, uint32_t array_size) {
     MemBuffer* buffer = OccupySlot(Kind::buffer, Buffers(), name);
-    if (buffer == nullptr) return -1;
-    return AllocateBuffer(*buffer, request.statement, request.element_size, request.array_size, request.type,
-                          request.precision, request.scale);
+    return buffer == nullptr ? -1 : AllocateBuffer(*buffer, statement, shape, array_size);
 }
 
 void GetBuffer(const CommandRow&, int, char** words) {
     const char* name = words[2];
-    Request request{};
-    if (!ResolveStatement(words[1], request.statement)) return;
+    void* statement = nullptr;
+    if (!ResolveOwner(words[1], statement)) return;
     if (std::strncmp(name, "$$", 2) == 0) return Message(kError, "Cannot start buffer name with $$\n");
     // Of the binds, not of the buffers: a second buffer of the same name is not refused.
     if (CheckInUse(Kind::bind, name)) return;
-    request.type = DecodeKeyword(words[3], SqltKeywords);
-    request.ReadSize(words[4]);
-    request.array_size = static_cast<uint32_t>(DecodeNumber(words[5]));
-    const int rc = IsNull(name) ? AllocateNameless(request) : AllocateNamed(name, request);
+    const ElementShape shape = ReadElementShape(DecodeKeyword(words[3], SqltKeywords), words[4]);
+    const uint32_t array_size = DecodeCount(words[5]);
+    const int rc = IsNull(name) ? AllocateNameless(statement, shape, array_size)
+                                : AllocateNamed(name, statement, shape, array_size);
     if (rc == 0) Message(kOutput, "GetMemOCI: memory buffer %s allocated.\n", name);
 }
 
@@ -95,12 +61,13 @@ void UpdateElement(const CommandRow&, int, char** words) {
     const long index = DecodeLong(words[2]);
     if (index < 0 || index >= long{buffer->array_size} || !buffer->Complete())
         return Message(kError, "Invalid elem value\n");
+    const auto element = static_cast<uint32_t>(index);
     const ElementTarget target = {buffer->type,
-                                  buffer->Element(static_cast<uint32_t>(index)),
+                                  buffer->Element(element),
                                   buffer->element_size,
-                                  buffer->indicators + index,
-                                  buffer->lengths + index,
-                                  buffer->return_codes + index,
+                                  buffer->Indicator(element),
+                                  buffer->Length(element),
+                                  buffer->ReturnCode(element),
                                   buffer->precision,
                                   buffer->scale};
     if (!AssignText(target, words[3], DecodeNumber(words[4]))) return;
@@ -156,7 +123,7 @@ void ListElements(Line& line, const MemBuffer& buffer) {
 
 void ListBuffers(const CommandRow&, int count, char** words) {
     void* statement = nullptr;
-    if (!ResolveStatement(words[1], statement)) return;
+    if (!ResolveOwner(words[1], statement)) return;
     const char* name = count > 2 ? words[2] : nullptr;
     const bool output = count > 3 && std::strcmp(words[3], "out") == 0;
     const char* statement_name = statement == nullptr ? "null" : words[1];

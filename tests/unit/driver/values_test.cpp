@@ -233,7 +233,7 @@ TEST(Values, SevenByteDatesThatArePossible) {
 TEST(Values, FreeingABufferGivesBackEveryBlock) {
     const size_t before = PlatformOutstanding("harnix");
     MemBuffer buffer{};
-    ASSERT_EQ(AllocateBuffer(buffer, nullptr, 10, 3, SQLT_STR, 0, 0), 0);
+    ASSERT_EQ(AllocateBuffer(buffer, nullptr, {.type = SQLT_STR, .size = 10}, 3), 0);
     // What dynamic binds and defines attach.
     buffer.dynamic.previous_lengths = static_cast<uint32_t*>(GetMem(3 * sizeof(uint32_t)));
     buffer.dynamic.piece_lengths = static_cast<uint32_t*>(GetMem(3 * sizeof(uint32_t)));
