@@ -2,8 +2,6 @@
 // integer formulas for the Julian and the Gregorian calendar, on years that astronomers count (1 BC is 0).
 #include "date/date.h"
 
-#include <ctime>
-
 #include "handles/errors.h"
 #include "oci_constants.h"
 
@@ -200,20 +198,6 @@ int Compare(const DateTime& left, const DateTime& right) noexcept {
     };
     const int order = Order(seconds(left), seconds(right));
     return order ? order : Order(left.nanosecond, right.nanosecond);
-}
-
-DateTime Now() noexcept {
-    timespec now{};
-    clock_gettime(CLOCK_REALTIME, &now);
-    std::tm local{};
-    localtime_r(&now.tv_sec, &local);
-    DateTime value;
-    SetDay(local.tm_year + 1900, local.tm_mon + 1, local.tm_mday, &value);
-    value.hour = static_cast<std::uint8_t>(local.tm_hour);
-    value.minute = static_cast<std::uint8_t>(local.tm_min);
-    value.second = static_cast<std::uint8_t>(local.tm_sec > 59 ? 59 : local.tm_sec);    // a leap second
-    value.nanosecond = static_cast<std::uint32_t>(now.tv_nsec);
-    return value;
 }
 
 }  // namespace date

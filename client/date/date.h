@@ -70,9 +70,6 @@ std::int32_t DaysBetween(const DateTime& left, const DateTime& right) noexcept; 
 // -1, 0, 1 by date, time and fraction as they stand; zones are date/zone.h's.
 int Compare(const DateTime& left, const DateTime& right) noexcept;
 
-// The clock, in local time.
-DateTime Now() noexcept;
-
 // OCIDate. Any field may be out of range; a fraction and a zone are lost on the way out.
 DateTime FromOciDate(const OCIDate& value) noexcept;
 void ToOciDate(const DateTime& value, OCIDate* result) noexcept;

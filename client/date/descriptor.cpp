@@ -130,6 +130,6 @@ date::Flags DateTimeDescriptor::Check() const {
 Status DateTimeDescriptor::Compare(const DateTimeDescriptor& left, const DateTimeDescriptor& right, int* result) {
     if (!left.is_set_ || !right.is_set_) return Error(errors::kInvalidDateTime);
     if (left.HasDate() != right.HasDate()) return Error(errors::kNotComparable);
-    *result = date::CompareMoments(left.value_, right.value_);
-    return {};
+    const int number = date::CompareMoments(left.value_, right.value_, result);
+    return number ? Error(number) : Status();
 }

@@ -90,16 +90,22 @@ Errno Parsed::Set(const Element& element, int value, std::size_t digits) noexcep
         if (row.field == ranged && (value < row.lowest || value > row.highest)) return row.number;
     }
     if (element.field == Field::hour12) value %= 12;
-    if (element.field == Field::rounded_year && digits <= 2) value = RoundedYear(value, Now().year);
-    if (element.field == Field::year && element.width < 4 && digits <= element.width) {
-        value = CompletedYear(value, element.width, Now().year);
+    const bool rounded = element.field == Field::rounded_year && digits <= 2;
+    const bool completed = element.field == Field::year && element.width < 4 && digits <= element.width;
+    if (rounded || completed) {
+        DateTime now;
+        if (const Errno number = Now(&now)) return number;
+        value = rounded ? RoundedYear(value, now.year) : CompletedYear(value, element.width, now.year);
     }
     Put(slot, value);
     return 0;
 }
 
 Errno Parsed::ResolveDate(DateTime* result) const noexcept {
-    const DateTime now = Now();
+    DateTime now;
+    if (!Has(Field::year) || !Has(Field::month)) {
+        if (const Errno number = Now(&now)) return number;
+    }
     result->year = static_cast<std::int16_t>(Has(Field::year) ? Get(Field::year) : now.year);
     if (Has(Field::era) && Get(Field::era) < 0) result->year = static_cast<std::int16_t>(-result->year);
     result->month = static_cast<std::uint8_t>(Has(Field::month) ? Get(Field::month) : now.month);

@@ -126,7 +126,7 @@ public:
         Element element;
         for (;;) {
             if (const Errno number = model.Next(scope_, &element)) return number;
-            if (element.field == Field::end) return 0;
+            if (element.field == Field::end) return error_;
             Put(element);
         }
     }
@@ -232,7 +232,7 @@ private:
     // A value without a zone is in that of the process.
     void PutZone(Field field) {
         DateTime zoned = value_;
-        if (!zoned.has_zone) (void)SetZone({}, &zoned);
+        if (!zoned.has_zone && !error_) error_ = SetZone({}, &zoned);
         switch (field) {
             case Field::zone_hour: return PutZoneHour(zoned.zone_minutes);
             case Field::zone_minute: return PutZoneMinute(zoned.zone_minutes);
@@ -260,6 +260,7 @@ private:
     Scope scope_;
     Writer& writer_;
     bool filled_ = true;    // leading zeros and trailing blanks
+    Errno error_ = 0;       // a zone that could not be told
 };
 
 }  // namespace

@@ -1,13 +1,19 @@
 // Zones of values: parsing what names one, the regions read so far, and comparing across zones.
 #include "date/zone.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
-#include <cstdio>
+#include <algorithm>
+#include <atomic>
+#include <cerrno>
 #include <cstdlib>
+#include <ctime>
 #include <map>
 #include <memory>
 #include <mutex>
+#include <new>
 #include <shared_mutex>
 #include <string>
 #include <vector>
@@ -23,14 +29,40 @@ constexpr const char* kZoneDirectory = "/usr/share/zoneinfo/";
 constexpr const char* kLocalZone = "/etc/localtime";
 constexpr std::size_t kMaxFile = 1 << 20;
 
+class Descriptor {
+public:
+    explicit Descriptor(const char* path) : number_(open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK)) {}
+    ~Descriptor() {
+        if (number_ >= 0) close(number_);
+    }
+    Descriptor(const Descriptor&) = delete;
+    Descriptor& operator=(const Descriptor&) = delete;
+    operator int() const { return number_; }
+
+private:
+    int number_;
+};
+
+// False when there is no such file, or none that may be read; what is short for the moment is thrown as bad_alloc, lest
+// a zone seem unknown.
 bool ReadRegularFile(const std::string& path, std::string* bytes) {
+    const Descriptor file(path.c_str());
+    if (file < 0) {
+        if (errno == ENOMEM || errno == EMFILE || errno == ENFILE) throw std::bad_alloc();
+        return false;
+    }
     struct stat status {};
-    if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) return false;
+    if (fstat(file, &status) != 0 || !S_ISREG(status.st_mode)) return false;
     if (status.st_size < 0 || static_cast<std::size_t>(status.st_size) > kMaxFile) return false;
-    const std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rbe"), std::fclose);
-    if (!file) return false;
     bytes->resize(static_cast<std::size_t>(status.st_size));
-    return std::fread(bytes->data(), 1, bytes->size(), file.get()) == bytes->size();
+    std::size_t length = 0;
+    while (length < bytes->size()) {
+        const ssize_t count = read(file, bytes->data() + length, bytes->size() - length);
+        if (count < 0 && errno == EINTR) continue;
+        if (count <= 0) return false;
+        length += static_cast<std::size_t>(count);
+    }
+    return true;
 }
 
 std::optional<ZoneRules> LoadFile(const std::string& path) {
@@ -70,9 +102,12 @@ public:
         const std::unique_lock lock(mutex_);
         if (const auto found = numbers_.find(name); found != numbers_.end()) return found->second;
         if (all_.size() >= UINT16_MAX) return 0;
-        all_.push_back(std::make_unique<Region>(Region{std::string(name), std::move(*rules)}));
-        const auto number = static_cast<std::uint16_t>(all_.size());
+        // Both lists or none, should memory run out.
+        auto region = std::make_unique<Region>(Region{std::string(name), std::move(*rules)});
+        const auto number = static_cast<std::uint16_t>(all_.size() + 1);
+        all_.reserve(number);
         numbers_.emplace(name, number);
+        all_.push_back(std::move(region));
         return number;
     }
 
@@ -87,11 +122,14 @@ private:
     std::vector<std::unique_ptr<Region>> all_;
 };
 
-// Never destroyed: threads may still ask while the process ends.
-Regions& TheRegions() {
-    static auto* regions = new Regions;
-    return *regions;
+// Never destroyed, as threads may still ask while the process ends; so made in place.
+template <class T> T& Immortal() {
+    alignas(T) static unsigned char place[sizeof(T)];
+    static T* const object = new (place) T;
+    return *object;
 }
+
+Regions& TheRegions() { return Immortal<Regions>(); }
 
 // What TZ names, else the system's zone, else Greenwich.
 ZoneRules LoadProcessZone() {
@@ -109,9 +147,36 @@ ZoneRules LoadProcessZone() {
     return rules ? std::move(*rules) : ZoneRules();
 }
 
-const ZoneRules& ProcessZone() {
-    static const auto* rules = new ZoneRules(LoadProcessZone());
-    return *rules;
+// The zone of the process, read at the first question that finds the memory for it.
+class LocalZone {
+public:
+    const ZoneRules& Rules() {
+        if (!known_.load(std::memory_order_acquire)) Read();
+        return rules_;
+    }
+
+private:
+    void Read() {
+        const std::lock_guard lock(mutex_);
+        if (known_.load(std::memory_order_relaxed)) return;
+        rules_ = LoadProcessZone();
+        known_.store(true, std::memory_order_release);
+    }
+
+    std::mutex mutex_;
+    std::atomic<bool> known_ = false;
+    ZoneRules rules_;
+};
+
+const ZoneRules& ProcessZone() { return Immortal<LocalZone>().Rules(); }
+
+// What may read the zone of the process ends here where memory is short.
+template <class Body> Errno Guarded(Body body) noexcept {
+    try {
+        return body();
+    } catch (const std::bad_alloc&) {
+        return errors::kOutOfMemory;
+    }
 }
 
 int SecondOfDay(const DateTime& value) { return (value.hour * 60 + value.minute) * 60 + value.second; }
@@ -186,14 +251,14 @@ Errno SetOffset(bool west, int hours, int minutes, DateTime* value) noexcept {
     return 0;
 }
 
-Errno SetZone(std::string_view zone, DateTime* value) noexcept try {
-    if (zone.empty()) {
-        SetOffset(OffsetMinutes(ProcessZone().AtWallTime(WallSeconds(*value))), 0, value);
-        return 0;
-    }
-    return zone.front() == '+' || zone.front() == '-' ? SetWrittenOffset(zone, value) : SetRegion(zone, value);
-} catch (const std::bad_alloc&) {
-    return errors::kOutOfMemory;
+Errno SetZone(std::string_view zone, DateTime* value) noexcept {
+    return Guarded([&]() -> Errno {
+        if (zone.empty()) {
+            SetOffset(OffsetMinutes(ProcessZone().AtWallTime(WallSeconds(*value))), 0, value);
+            return 0;
+        }
+        return zone.front() == '+' || zone.front() == '-' ? SetWrittenOffset(zone, value) : SetRegion(zone, value);
+    });
 }
 
 std::string_view RegionName(const DateTime& value) noexcept {
@@ -206,25 +271,43 @@ std::string_view ZoneAbbreviation(const DateTime& value) noexcept {
     return region ? region->rules.At(MomentSeconds(value)).abbreviation : std::string_view();
 }
 
-int CompareMoments(const DateTime& left, const DateTime& right) noexcept {
-    if (!left.has_zone && !right.has_zone) return Compare(left, right);
-    const std::int64_t left_seconds = MomentSeconds(left), right_seconds = MomentSeconds(right);
-    if (left_seconds != right_seconds) return left_seconds < right_seconds ? -1 : 1;
-    if (left.nanosecond != right.nanosecond) return left.nanosecond < right.nanosecond ? -1 : 1;
-    return 0;
+Errno CompareMoments(const DateTime& left, const DateTime& right, int* order) noexcept {
+    return Guarded([&]() -> Errno {
+        if (!left.has_zone && !right.has_zone) {
+            *order = Compare(left, right);
+            return 0;
+        }
+        const std::int64_t left_seconds = MomentSeconds(left), right_seconds = MomentSeconds(right);
+        *order = left_seconds != right_seconds ? (left_seconds < right_seconds ? -1 : 1)
+                                               : (left.nanosecond > right.nanosecond) - (left.nanosecond < right.nanosecond);
+        return 0;
+    });
 }
 
 Errno ToOffset(const DateTime& value, int zone_minutes, DateTime* result) noexcept {
-    DateTime moved = value;
-    const std::int64_t wall = MomentSeconds(value) + zone_minutes * std::int64_t{60};
-    if (const Errno number = MoveSeconds(wall - WallSeconds(value), &moved)) return number;
-    SetOffset(zone_minutes, 0, &moved);
-    *result = moved;
-    return 0;
+    return Guarded([&]() -> Errno {
+        DateTime moved = value;
+        const std::int64_t wall = MomentSeconds(value) + zone_minutes * std::int64_t{60};
+        if (const Errno number = MoveSeconds(wall - WallSeconds(value), &moved)) return number;
+        SetOffset(zone_minutes, 0, &moved);
+        *result = moved;
+        return 0;
+    });
 }
 
 Errno ToLocal(const DateTime& value, DateTime* result) noexcept {
-    return ToOffset(value, OffsetMinutes(ProcessZone().At(MomentSeconds(value))), result);
+    return Guarded(
+        [&] { return ToOffset(value, OffsetMinutes(ProcessZone().At(MomentSeconds(value))), result); });
+}
+
+Errno Now(DateTime* result) noexcept {
+    timespec now{};
+    clock_gettime(CLOCK_REALTIME, &now);
+    DateTime value{.year = 1970, .month = 1, .day = 1, .nanosecond = static_cast<std::uint32_t>(now.tv_nsec)};
+    const Errno number =
+        Guarded([&] { return MoveSeconds(now.tv_sec + ProcessZone().At(now.tv_sec).offset, &value); });
+    if (!number) *result = value;
+    return number;
 }
 
 }  // namespace date

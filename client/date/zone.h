@@ -1,5 +1,8 @@
 // Time zones: offsets like "+05:30" and regions like "Europe/Paris", whose rules are read from the system's zone data.
 // A region is known by a small number that stays the same for the life of the process. Safe from several threads.
+//
+// What needs rules for the first time reads them, which may lack memory or a file handle: 1019, and nothing is kept of
+// that; the next call tries again. "The zone of the process" may be read so by every function that answers an Errno.
 #pragma once
 
 #include <cstdint>
@@ -23,10 +26,13 @@ std::string_view RegionName(const DateTime& value) noexcept;
 std::string_view ZoneAbbreviation(const DateTime& value) noexcept;
 
 // -1, 0, 1 by the moment that is meant; a value without a zone counts as one in the zone of the process.
-int CompareMoments(const DateTime& left, const DateTime& right) noexcept;
+Errno CompareMoments(const DateTime& left, const DateTime& right, int* order) noexcept;
 
 // The same moment seen at an offset, or in the zone of the process.
 Errno ToOffset(const DateTime& value, int zone_minutes, DateTime* result) noexcept;
 Errno ToLocal(const DateTime& value, DateTime* result) noexcept;
+
+// The clock in the zone of the process, without a zone.
+Errno Now(DateTime* result) noexcept;
 
 }  // namespace date

@@ -3,6 +3,7 @@
 
 #include "date/date.h"
 #include "date/format.h"
+#include "date/zone.h"
 #include "entry/text_argument.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
@@ -138,7 +139,9 @@ sword OCIDateDaysBetween(OCIError* err, const OCIDate* date1, const OCIDate* dat
 sword OCIDateSysDate(OCIError* err, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
         if (!out) return Error(errors::kNullArgument);
-        date::ToOciDate(date::Now(), out);
+        date::DateTime now;
+        if (const int number = date::Now(&now)) return Error(number);
+        date::ToOciDate(now, out);
         return {};
     });
 }

@@ -8,6 +8,7 @@
 #include <string>
 
 #include "date/date.h"
+#include "date/zone.h"
 #include "engine/sqlite/characters.h"
 #include "engine/sqlite/coercion.h"
 #include "engine/sqlite/column_types.h"
@@ -95,7 +96,8 @@ void ToDate(sqlite3_context* context, int count, Arguments arguments) {
 // The present moment in local time: as a date, or with fraction and zone.
 template <bool whole_seconds>
 void Now(sqlite3_context* context, int, Arguments) {
-    date::DateTime now = date::Now();
+    date::DateTime now;
+    if (const int failure = date::Now(&now)) return Refuse(context, failure);
     if (whole_seconds) {
         now.nanosecond = 0;
         now.has_zone = false;

@@ -73,8 +73,11 @@ TEST(Zone, ComparesMoments) {
         {"1582-10-15 00:00:00 +02:00", "1582-10-04 22:00:00 +00:00", 0},
         {"2024-01-01 00:00:00", "2024-01-01 00:00:01", -1}};
     for (const auto& c : cases) {
-        EXPECT_EQ(CompareMoments(Read(c.left), Read(c.right)), c.order) << c.left << ' ' << c.right;
-        EXPECT_EQ(CompareMoments(Read(c.right), Read(c.left)), -c.order) << c.left << ' ' << c.right;
+        int order = 9, reverse = 9;
+        EXPECT_EQ(CompareMoments(Read(c.left), Read(c.right), &order), 0);
+        EXPECT_EQ(CompareMoments(Read(c.right), Read(c.left), &reverse), 0);
+        EXPECT_EQ(order, c.order) << c.left << ' ' << c.right;
+        EXPECT_EQ(reverse, -c.order) << c.left << ' ' << c.right;
     }
 }
 
@@ -85,6 +88,24 @@ TEST(Zone, SeesAMomentElsewhere) {
     EXPECT_EQ(std::string(text, ToEngineText(moved, text)), "2023-12-31 11:00:00 -08:00");
     EXPECT_EQ(ToOffset(Read("9999-12-31 23:30:00 +00:00"), 60, &moved), 1841);
     EXPECT_EQ(ToOffset(Read("-4712-01-01 00:30:00 +01:00"), 0, &moved), 1841);
+}
+
+TEST(Zone, TheClockIsThatOfTheProcess) {
+    DateTime now;
+    const std::time_t before = std::time(nullptr);
+    ASSERT_EQ(Now(&now), 0);
+    const std::time_t after = std::time(nullptr);
+    std::tm first{}, last{};
+    localtime_r(&before, &first);
+    localtime_r(&after, &last);
+    char text[kMaxEngineText];
+    const std::string shown(text, ToEngineText(now, text));
+    const auto show = [&](const std::tm& moment) {
+        return std::string(text, std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &moment));
+    };
+    EXPECT_GE(shown.substr(0, 19), show(first));
+    EXPECT_LE(shown.substr(0, 19), show(last));
+    EXPECT_EQ(Validate(now), 0);
 }
 
 std::string FileBytes(const std::string& path) {
@@ -124,6 +145,8 @@ TEST(ZoneRules, TextsOfRules) {
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"},
         {"EST5EDT", 1720000000, -14400, "EDT"},
         {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
+        {"XXX3YYY2,J59/0,300/0", 1709089199, -10800, "XXX"},      // J59 is 28 February, in leap years too
+        {"XXX3YYY2,J59/0,300/0", 1709089200, -7200, "YYY"},
         {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},      // J60 is 1 March in leap years, too
         {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"}};
     for (const auto& c : cases) {
