@@ -1,10 +1,10 @@
 // The lookup of commands by what a typed word begins, and the table of handlers. Set up at start-up, then only read.
 #include "core/command_table.h"
 
+#include <array>
 #include <cctype>
 #include <cstdlib>
 #include <cstring>
-#include <iterator>
 
 #include "core/messages.h"
 
@@ -28,6 +28,18 @@ constexpr bool CodesAreSound() {
     return true;
 }
 static_assert(CodesAreSound(), "a code in commands.def is used twice or out of bounds");
+
+// Which codes are a command's.
+constexpr auto kIsCommand = [] {
+    std::array<bool, kHighestCommandCode + 1> is_command{};
+    for (const Code code : kCommandCodes) is_command[static_cast<size_t>(code)] = true;
+    return is_command;
+}();
+
+bool IsCommand(Code code) {
+    const int place = static_cast<int>(code);
+    return place >= 0 && place <= kHighestCommandCode && kIsCommand[static_cast<size_t>(place)];
+}
 
 // The first four characters rule most rows out; every word of the table has as many, a closing zero counted.
 bool Begins(const char* folded, size_t length, const char* word) {
@@ -55,14 +67,14 @@ const Command* FindCommand(const char* word) {
 }
 
 void HandlerTable::Set(const CommandRow& row, void (*run)(const CommandRow&, int, char**)) {
-    if (std::ranges::find(kCommandCodes, row.code) == std::end(kCommandCodes)) RefuseRow(row, "is no command's");
+    if (!IsCommand(row.code)) RefuseRow(row, "is no command's");
     Handler& handler = handlers_[static_cast<int>(row.code)];
     if (handler.row != nullptr) RefuseRow(row, "has two handlers");
     handler = {&row, run};
 }
 
 const HandlerTable::Handler* HandlerTable::Find(Code code) const {
-    const int place = static_cast<int>(code);
-    if (place < 0 || place > kHighestCommandCode || handlers_[place].row == nullptr) return nullptr;
-    return &handlers_[place];
+    if (!IsCommand(code)) return nullptr;
+    const Handler& handler = handlers_[static_cast<int>(code)];
+    return handler.row == nullptr ? nullptr : &handler;
 }

@@ -1,5 +1,8 @@
-// The one writer: formats to standard output, flushes the stream a message is meant for.
+// The one writer: formats to standard output, flushes the stream a message is meant for. Any thread.
 #include "core/messages.h"
+
+#include <stdio_ext.h>
+#include <unistd.h>
 
 #include <cstdarg>
 #include <cstdio>
@@ -12,6 +15,15 @@ char output_room[kOutputRoom];
 
 void Flush(Stream stream) {
     std::fflush(stream == kOutput ? stdout : stderr);
+}
+
+// Writes past the buffer where nothing waits in it: most of the log is whole lines, and a row of a large result costs
+// little more than its write. Answers how much was written; what was not is for the buffer to keep.
+size_t WriteAtOnce(std::string_view text) {
+    flockfile(stdout);
+    const ssize_t written = __fpending(stdout) == 0 ? write(fileno(stdout), text.data(), text.size()) : 0;
+    funlockfile(stdout);
+    return written > 0 ? static_cast<size_t>(written) : 0;
 }
 
 }  // namespace
@@ -29,6 +41,9 @@ void Message(Stream stream, const char* format, ...) {
 }
 
 void MessageText(Stream stream, std::string_view text) {
+    const size_t written = stream == kOutput ? WriteAtOnce(text) : 0;
+    if (written > 0 && written == text.size()) return;
+    text.remove_prefix(written);
     std::fwrite(text.data(), 1, text.size(), stdout);
     Flush(stream);
 }

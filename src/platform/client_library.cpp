@@ -108,11 +108,6 @@ const char* XaSwitchName() {
     return Setting("HARNIX_XA_SWITCH", "rmXaSwitch");
 }
 
-// Functions of our own library that others do without.
-bool MayBeAbsent(std::string_view name) {
-    return name == "OCI_memGetMemCount" || name == "XaGetInfo";
-}
-
 }  // namespace
 
 void SetLoaderComplaint(LoaderComplaint complain) {
@@ -136,7 +131,7 @@ void LoadClientLibrary() {
 
 xa_switch_t* XaSwitch() {
     LoadClientLibrary();
-    if (!loader.xa_switch) ComplainMissing(XaSwitchName());
+    if (!loader.xa_switch) CallMissing(XaSwitchName(), Missing::complains_and_answers_error);
     return loader.xa_switch;
 }
 
@@ -147,12 +142,9 @@ void ForgetClientLibrary() {
     client_library = {};
 }
 
-void ComplainMissing(const char* name) {
-    if (!loader.handle || MayBeAbsent(name)) return;
-    Complain(std::string("Function ") + name + " not found in client library\n");
-}
-
-int ResultWhenMissing(const char* name) {
-    const std::string_view wanted = name;
-    return wanted == "OCI_memGetMemCount" || wanted == "OCIThreadIsMulti" ? 0 : OCI_ERROR;
+int CallMissing(const char* name, Missing missing) {
+    const bool complains =
+        missing == Missing::complains_and_answers_error || missing == Missing::complains_and_answers_zero;
+    if (loader.handle && complains) Complain(std::string("Function ") + name + " not found in client library\n");
+    return missing == Missing::complains_and_answers_zero || missing == Missing::answers_zero ? 0 : OCI_ERROR;
 }

@@ -14,14 +14,19 @@
 #include "oci.h"
 #include "xa.h"
 
+// What a call does where the library has no such function. Those that only our own library exports pass in silence.
+enum class Missing { complains_and_answers_error, complains_and_answers_zero, answers_error, answers_zero };
+
 template <class Signature>
 struct LibraryFunction {
     const char* name;
+    Missing missing = Missing::complains_and_answers_error;
     Signature* pointer = nullptr;    // null: not loaded yet, or not exported
 };
 
 struct ClientLibrary {
 #define FUNCTION(symbol) LibraryFunction<decltype(::symbol)> symbol{#symbol};
+#define FUNCTION_WITH(symbol, missing) LibraryFunction<decltype(::symbol)> symbol{#symbol, Missing::missing};
 #include "platform/client_functions.def"
 #undef FUNCTION
 };
@@ -42,12 +47,9 @@ xa_switch_t* XaSwitch();
 // Forgets the library and the failures, so that the next call loads anew; what was loaded stays loaded. For tests.
 void ForgetClientLibrary();
 
-// Complains that the loaded library has no such function. Says nothing where the library itself is missing, or where
-// doing without the function is expected.
-void ComplainMissing(const char* name);
-
-// What a call of a missing function answers where its result is an int: OCI_ERROR, but 0 for counts and truth values.
-int ResultWhenMissing(const char* name);
+// Complains, if that is called for, that the loaded library has no such function. Says nothing where the library itself
+// is missing. Answers what a call answers whose result is an int.
+int CallMissing(const char* name, Missing missing);
 
 // Whether the library exports the function, or one that stands in for it. Loads the library, complains never.
 template <class Signature>
@@ -56,18 +58,23 @@ bool Exports(LibraryFunction<Signature> ClientLibrary::*function) {
     return (client_library.*function).pointer != nullptr;
 }
 
+// The rare half of Call, kept out of it so that the call itself stays small.
 template <class Result, class... Parameters>
-Result Call(LibraryFunction<Result(Parameters...)> ClientLibrary::*function,
-            std::type_identity_t<Parameters>... arguments) {
+[[gnu::noinline]] Result LoadAndCall(LibraryFunction<Result(Parameters...)> ClientLibrary::*function,
+                                     Parameters... arguments) {
+    LoadClientLibrary();
     const auto& entry = client_library.*function;
-    if (!entry.pointer) [[unlikely]] {
-        LoadClientLibrary();
-        if (!entry.pointer) {
-            ComplainMissing(entry.name);
-            if constexpr (std::is_same_v<Result, int>) return ResultWhenMissing(entry.name);
-            else return Result();
-        }
-    }
+    if (entry.pointer) return entry.pointer(arguments...);
+    const int result = CallMissing(entry.name, entry.missing);
+    if constexpr (std::is_same_v<Result, int>) return result;
+    else return Result();
+}
+
+template <class Result, class... Parameters>
+inline Result Call(LibraryFunction<Result(Parameters...)> ClientLibrary::*function,
+                   std::type_identity_t<Parameters>... arguments) {
+    const auto& entry = client_library.*function;
+    if (!entry.pointer) [[unlikely]] return LoadAndCall(function, arguments...);
     return entry.pointer(arguments...);
 }
 

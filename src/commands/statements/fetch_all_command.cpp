@@ -51,6 +51,7 @@ private:
 
     OCIStmt* statement_;
     OCIError* error_;
+    const bool utf16_ = Utf16Mode;
     ub4 columns_ = 0;
     ub4 defined_ = 0;  // of the columns
     Memory<OCIDefine*> defines_;
@@ -116,7 +117,7 @@ bool Table::AddColumnName(ub4 position) {
     ub4 length = 0;
     rc = Call(&ClientLibrary::OCIAttrGet, column, ub4{OCI_DTYPE_PARAM}, &name, &length, ub4{OCI_ATTR_NAME}, error_);
     if (!Check(rc, Failed(rc))) return false;
-    AddText(line_, name, length, Utf16Mode, Quotes::never);
+    AddText(line_, name, length, utf16_, Quotes::never);
     return true;
 }
 
@@ -169,13 +170,13 @@ bool Table::ReceivePiece() {
 
 void Table::TakePiece() {
     const char* const text = buffer_.get();
-    if (Utf16Mode) value_.append(text, utf::Utf16Length(text, length_));
+    if (utf16_) value_.append(text, utf::Utf16Length(text, length_));
     else line_.Text({text, strnlen(text, length_)});
 }
 
 void Table::EndValue(ub4 column) {
     if (indicator_ == OCI_IND_NULL) line_.Character('-');
-    else if (Utf16Mode) AddText(line_, value_.data(), value_.size(), Utf16Mode, Quotes::never);
+    else if (utf16_) AddText(line_, value_.data(), value_.size(), true, Quotes::never);
     line_.Character(column < columns_ ? ',' : '\n');
 }
 
