@@ -1,4 +1,5 @@
-// The text of one step as an engine reads it: its placeholders numbered, the spellings that it does not know replaced.
+// The text of one step as an engine reads it: its placeholders numbered, the spellings that it does not know replaced
+// by those of its dialect. Nothing here knows an engine.
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,6 @@
 // What a statement's text says before any engine has seen it: its kind, its placeholders, and the steps it runs in. A
 // plain statement is one step; a block `begin ... end;` is one for each statement in it. Offsets are bytes in the text.
+// It owns what it says; scanning is a pure function, for any thread.
 #pragma once
 
 #include <cstdint>

@@ -1,3 +1,4 @@
+// Cutting SQL text into tokens: one look at each character, but for what closes a quote. Any thread.
 #include "sql/token.h"
 
 #include <algorithm>

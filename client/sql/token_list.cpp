@@ -1,3 +1,4 @@
+// Questions about tokens that stand beside each other. Any thread.
 #include "sql/token_list.h"
 
 #include <algorithm>

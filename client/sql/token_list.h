@@ -1,4 +1,4 @@
-// What Scan and Rewrite both ask of a statement's tokens.
+// What Scan and Rewrite both ask of a statement's tokens. Tokens are views of the text, which must outlive them.
 #pragma once
 
 #include <string_view>

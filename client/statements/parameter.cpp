@@ -62,7 +62,9 @@ Status IsNullable(Parameter& parameter, AttributeValue& value) {
 Status DisplaySize(Parameter& parameter, AttributeValue& value) {
     constexpr std::uint64_t kNumber = 40, kDate = 9, kTimestamp = 31, kRowId = 18;
     switch (parameter.column.type) {
-        case SQLT_NUM: value.integer = kNumber; break;
+        case SQLT_NUM:
+        case SQLT_IBFLOAT:
+        case SQLT_IBDOUBLE: value.integer = kNumber; break;
         case SQLT_DAT: value.integer = kDate; break;
         case SQLT_TIMESTAMP:
         case SQLT_TIMESTAMP_TZ:

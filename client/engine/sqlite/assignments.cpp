@@ -1,4 +1,4 @@
-// Finding where a statement stores values, by its pieces.
+// Finding where a statement stores values, by its pieces: from the verb on, clause by clause.
 #include "engine/sqlite/assignments.h"
 
 #include <algorithm>

@@ -1,4 +1,5 @@
 // Declared types: what a column's declaration says about its values. SQLite keeps the words and little more.
+// Pure functions; any thread.
 #pragma once
 
 #include <string_view>

@@ -1,10 +1,13 @@
-// Finding comparisons and what they compare.
+// Finding comparisons and what they compare, in one pass over the pieces; a table is asked for its columns when a name is
+// to be told. Linear but for the depth of what lies in parentheses.
 #include "engine/sqlite/comparisons.h"
 
 #include <algorithm>
 #include <array>
 #include <deque>
+#include <set>
 #include <string>
+#include <utility>
 
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/function_values.h"
@@ -225,13 +228,12 @@ private:
         Add(span, "kelp_compare(", ", " + Literal(column.declared) + ", " + Literal(column.column.name) + ")", false);
     }
 
-    // The same value may be compared with two columns.
+    // A value may be compared with two columns; the first one counts.
     void Add(Span span, std::string before, std::string after, bool replaces) {
+        if (!added_.insert({span.first, span.last}).second) return;
         const auto begin = static_cast<std::size_t>(At(span.first).data() - sql_.data());
         const std::string_view last = At(span.last - 1);
         const auto end = static_cast<std::size_t>(last.data() - sql_.data()) + last.size();
-        for (const auto& edit : targets_.edits)
-            if (edit.begin == begin && edit.end == end && edit.after == after && edit.before == before) return;
         targets_.edits.push_back({begin, end, std::move(before), std::move(after), replaces});
     }
 
@@ -324,6 +326,7 @@ private:
     const std::vector<std::string_view>& pieces_;
     Operands operands_;
     ValueTargets& targets_;
+    std::set<std::pair<std::size_t, std::size_t>> added_;    // pieces that have their edit
     Status status_;
     std::vector<std::size_t> scopes_;     // by piece
     std::vector<std::size_t> parents_;    // by scope; the outermost is its own

@@ -1,4 +1,4 @@
-// What SQLite and the text of a statement tell about its columns, and about what it does.
+// What SQLite and the text of a statement tell about its columns, and about what it does. On the connection's thread.
 #pragma once
 
 #include <sqlite3.h>

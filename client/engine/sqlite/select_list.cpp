@@ -1,4 +1,4 @@
-// Reading the items of a select list.
+// Reading the items of a select list: an alias is cut off, what is left is told by its first pieces.
 #include "engine/sqlite/select_list.h"
 
 #include <algorithm>

@@ -1,6 +1,7 @@
 // How numbers lie in a database: an integer when the value is one and fits 64 bits, a real when it has at most 15
 // significant digits, else a blob: four bytes that mark it, then the number's bytes without the leading count. Blobs of
-// numbers sort as the numbers do, but behind all integers and reals, and SQL cannot compute with them.
+// numbers sort as the numbers do, but behind all integers and reals, and SQL cannot compute with them. Pure
+// functions; any thread.
 #pragma once
 
 #include <sqlite3.h>

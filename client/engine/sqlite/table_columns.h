@@ -1,4 +1,5 @@
-// The columns of a table as they are declared.
+// The columns of a table as they are declared, asked of SQLite each time: another connection may change them. On the
+// connection's thread. Throws bad_alloc where SQLite finds no memory, so that no column is taken for unknown.
 #pragma once
 
 #include <sqlite3.h>
