@@ -1,5 +1,5 @@
 // Every command family: the function that adds its rows, declared and listed here. A command whose family is not listed
-// is known by name but has no handler.
+// is known by name but has no handler. Added at start-up by the command thread.
 #pragma once
 
 #include "core/command_table.h"

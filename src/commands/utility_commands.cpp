@@ -1,5 +1,5 @@
 // Options, the client's INI file, removing a file, the locale, pausing. No command here calls the library. Most usage
-// texts end in a line feed of their own, so that an empty line follows them.
+// texts end in a line feed of their own, so that an empty line follows them. Command thread only.
 #include <clocale>
 #include <cstdio>
 #include <cstring>

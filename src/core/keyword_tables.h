@@ -1,5 +1,5 @@
 // The keyword tables. Order matters: a word matches the first keyword that it begins, so the tables keep their rows,
-// duplicates included, in the order that scripts have come to rely on.
+// duplicates included, in the order that scripts have come to rely on. Any thread.
 #pragma once
 
 #include <climits>

@@ -12,7 +12,7 @@
 
 namespace {
 
-constexpr size_t kLongestPiece = 128;  // of a bitmask; what is beyond is not looked at
+constexpr size_t kLongestWord = 128;  // of a bitmask; what is beyond is not looked at
 
 void ComplainOfEmptyWord() {
     Message(kError, "DecodeKeyword(): Null length token.\n");
@@ -20,7 +20,7 @@ void ComplainOfEmptyWord() {
 
 // The first row whose keyword the word begins, or null.
 const KeywordTable* FindRow(std::string_view word, const KeywordTable* table) {
-    char folded[kLongestPiece];
+    char folded[kLongestWord];
     if (word.empty() || word.size() > sizeof folded) return nullptr;  // no keyword is that long
     for (size_t index = 0; index < word.size(); ++index)
         folded[index] = static_cast<char>(std::tolower(static_cast<unsigned char>(word[index])));
@@ -32,33 +32,33 @@ const KeywordTable* FindRow(std::string_view word, const KeywordTable* table) {
 }
 
 // One word of a bitmask: ORs its value into `mask`, or complains. Returns whether it matched.
-bool AddPiece(std::string_view text, const KeywordTable* table, int& mask) {
-    char piece[kLongestPiece];
+bool AddWord(std::string_view text, const KeywordTable* table, int& mask) {
+    char word[kLongestWord];
     size_t length = 0;
     for (const char character : text) {
         if (character == ' ' || character == '\t') continue;
-        if (length == sizeof piece) break;
-        piece[length++] = character;
+        if (length == sizeof word) break;
+        word[length++] = character;
     }
     if (length == 0) {
         ComplainOfEmptyWord();
         return false;
     }
-    const KeywordTable* row = FindRow({piece, length}, table);
+    const KeywordTable* row = FindRow({word, length}, table);
     if (row == nullptr) {
-        Message(kOutput, "Warning : Unrecognized Token in bitmask : %.*s\n", static_cast<int>(length), piece);
+        Message(kOutput, "Warning : Unrecognized Token in bitmask : %.*s\n", static_cast<int>(length), word);
         return false;
     }
     mask |= row->value;
     return true;
 }
 
-// Returns whether any piece matched.
+// Returns whether any word matched.
 bool Decode(std::string_view rest, const KeywordTable* table, int& mask) {
     bool matched = false;
     for (;;) {
         const size_t bar = rest.find('|');
-        matched |= AddPiece(rest.substr(0, bar), table, mask);
+        matched |= AddWord(rest.substr(0, bar), table, mask);
         if (bar == std::string_view::npos) return matched;
         rest.remove_prefix(bar + 1);
     }

@@ -1,4 +1,4 @@
-// Symbolic words and their values, and the reading of plain numbers.
+// Symbolic words and their values, and the reading of plain numbers. Command thread only.
 #pragma once
 
 #include <string_view>
@@ -9,7 +9,7 @@
 // "DecodeKeyword(): Null length token.\n" and finds nothing.
 int DecodeKeyword(const char* word, const KeywordTable* table);
 
-// The OR of the values of the words joined by "|"; blanks are ignored. A piece that matches nothing prints a warning
+// The OR of the values of the words joined by "|"; blanks are ignored. A word that matches nothing prints a warning
 // and adds nothing.
 int DecodeBitmask(const char* word, const KeywordTable* table);
 

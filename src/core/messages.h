@@ -1,6 +1,6 @@
 // All text the driver writes. A message is formatted to standard output and then the named stream is flushed, so that
 // the log is one ordered stream and the choice of stream decides only the flush. A line of the log is one message:
-// whoever prints a line in pieces puts them together in a Line first.
+// whoever prints a line in pieces puts them together in a Line first. Any thread.
 #pragma once
 
 #include <cstddef>

@@ -1,4 +1,4 @@
-// From the words of a line to the command they name.
+// From the words of a line to the command they name. Command thread only.
 #pragma once
 
 #include "core/command_table.h"

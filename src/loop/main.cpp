@@ -1,4 +1,4 @@
-// The entry: start-up, the loop over standard input, the exit.
+// The entry: start-up, the loop over standard input, the exit. Command thread only.
 #include <csignal>
 #include <cstring>
 

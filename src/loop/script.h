@@ -1,4 +1,4 @@
-// The loop: prompts, reads, echoes and runs command lines of an open stream.
+// The loop: prompts, reads, echoes and runs command lines of an open stream. Command thread only.
 #pragma once
 
 #include <cstdio>

@@ -1,4 +1,4 @@
-// Splits a command line into words.
+// Splits a command line into words. Command thread only.
 #pragma once
 
 #include <cstddef>

@@ -1,6 +1,7 @@
 // Memory buffers: named arrays of elements of one external data type, with an indicator, a length and a return code for
 // each element. Binds and defines hand their addresses to the library; the listing shows what it wrote there. The
 // blocks are the buffer's own; the pointers "for calls" are what commands pass on, and a script may set them to null.
+// Command thread only.
 #pragma once
 
 #include <cstddef>

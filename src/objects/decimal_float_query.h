@@ -1,4 +1,4 @@
-// Decimal floats as the server writes them.
+// Decimal floats as the server writes them. Command thread only.
 #pragma once
 
 #include <cstdint>

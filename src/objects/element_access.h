@@ -1,4 +1,4 @@
-// Typed reading and writing of an element's bytes, never past the element's end and at any alignment.
+// Typed reading and writing of an element's bytes, never past the element's end and at any alignment. Any thread.
 #pragma once
 
 #include <algorithm>

@@ -1,4 +1,4 @@
-// The library's numbers from plain texts of the driver.
+// The library's numbers from plain texts of the driver. Command thread only.
 #pragma once
 
 #include <string_view>

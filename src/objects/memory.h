@@ -1,4 +1,4 @@
-// Memory of the driver's own: blocks tagged "harnix" with the line that asked for them.
+// Memory of the driver's own: blocks tagged "harnix" with the line that asked for them. Any thread.
 #pragma once
 
 #include <cstddef>

@@ -1,6 +1,6 @@
 // Memory structs: named arrays of rows; a row holds, for each member in turn, its value area, indicator, length and
 // return code, each aligned as its type needs. Members can be seen as buffers, too: a view is an entry of the buffer
-// table under the struct's name, "$$" and the member's index.
+// table under the struct's name, "$$" and the member's index. Command thread only.
 #pragma once
 
 #include <cstddef>

@@ -1,4 +1,4 @@
-// Texts between the application code page and UTF-16, and the text arguments of commands.
+// Texts between the application code page and UTF-16, and the text arguments of commands. Any thread.
 #pragma once
 
 #include <cstddef>

@@ -1,4 +1,4 @@
-// Texts of a script stored into elements, by external data type.
+// Texts of a script stored into elements, by external data type. Command thread only.
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,6 @@
 // Values as the log shows them, by external data type. A value is one line: a prefix with indicator, return code and
 // length, then the value. Lengths that the library returned are never followed past the end of the element.
+// Command thread only.
 #pragma once
 
 #include <cstdint>

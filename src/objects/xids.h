@@ -1,4 +1,5 @@
 // Named identifiers of global transactions. A slot once used stays used: nothing gives an identifier back.
+// Command thread only.
 #pragma once
 
 #include "xa.h"

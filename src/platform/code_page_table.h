@@ -1,4 +1,5 @@
 // The code pages that can be converted: number, the converter's name for it, and bytes of its smallest unit.
+// Any thread.
 #pragma once
 
 #include <cstddef>

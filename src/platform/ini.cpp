@@ -48,7 +48,7 @@ std::size_t CopyKeys(const std::vector<IniSetting>& settings, char* buffer, std:
     return length;
 }
 
-IniText ReadIni(const char* file) {
+IniText LoadIni(const char* file) {
     std::string content;
     if (!ReadWholeFile(PathOf(file), content)) content.clear();
     return IniText(content);
@@ -76,13 +76,13 @@ bool CanHold(std::string_view section, std::string_view key, std::string_view va
 std::size_t IniReadString(const char* file, const char* section, const char* key, const char* otherwise, char* buffer,
                           std::size_t capacity) {
     if (!key) return CopyKeys(IniReadSection(file, section, capacity), buffer, capacity);
-    const IniText ini = ReadIni(file);
+    const IniText ini = LoadIni(file);
     const std::string* const value = ini.Find(section, key);
     return CopyText(value ? *value : otherwise ? otherwise : "", buffer, capacity);
 }
 
 std::vector<IniSetting> IniReadSection(const char* file, const char* section, std::size_t most_key_bytes) {
-    return SettingsWithin(most_key_bytes, ReadIni(file).Settings(section));
+    return SettingsWithin(most_key_bytes, LoadIni(file).Settings(section));
 }
 
 bool IniWriteString(const char* file, const char* section, const char* key, const char* value) {

@@ -1,4 +1,4 @@
-// The text of an INI file, taken apart into lines that keep every byte.
+// The text of an INI file, taken apart into lines that keep every byte. Any thread.
 #pragma once
 
 #include <string>

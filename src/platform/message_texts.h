@@ -1,4 +1,4 @@
-// Texts for the diagnostics of an XA call, broken into lines.
+// Texts for the diagnostics of an XA call, broken into lines. Any thread.
 #pragma once
 
 #include <cstddef>

@@ -1,4 +1,4 @@
-// The code pages of the process, from its environment or its locale.
+// The code pages of the process, from its environment or its locale. Any thread.
 #include <langinfo.h>
 #include <locale.h>
 

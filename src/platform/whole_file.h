@@ -1,4 +1,4 @@
-// Files read and replaced as a whole.
+// Files read and replaced as a whole. Any thread.
 #pragma once
 
 #include <string>

@@ -1,5 +1,5 @@
 // Diagnostic texts as the log shows them: converted from UTF-16 where that mode is on, the server tag made the same for
-// every server, the first line end rewritten.
+// every server, the first line end rewritten. Any thread.
 #pragma once
 
 #include <cstddef>

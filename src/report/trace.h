@@ -1,4 +1,4 @@
-// The trace line of a library call: the function's name and, for most, the object it was called for.
+// The trace line of a library call: the function's name and, for most, the object it was called for. Any thread.
 #pragma once
 
 #include "core/command_table.h"

@@ -1,5 +1,5 @@
 // The attributes that scripts know by name: what each is called, its number, the shape in which the library takes and
-// gives it, and the handles and descriptors that have it.
+// gives it, and the handles and descriptors that have it. Command thread only.
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,5 @@
 // Reading and setting attributes. What a value looks like, in the words of a script and to the library, follows from
-// the shape of the attribute: a row a shape. Areas start as zeros and are larger than any value.
+// the shape of the attribute: a row a shape. Areas start as zeros and are larger than any value. Command thread only.
 #include <algorithm>
 #include <cstring>
 #include <optional>

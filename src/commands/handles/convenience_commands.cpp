@@ -1,4 +1,5 @@
 // Connecting in one line, and ending what that made in another. The calls inside leave no trace lines.
+// Command thread only.
 #include <cstring>
 #include <string_view>
 
@@ -13,7 +14,7 @@ namespace {
 
 // --- QuickConnectOCI -------------------------------------------------------------------------------------------------
 
-OCIEnv* MakeEnvironment(const char* name) {
+OCIEnv* ConnectEnvironment(const char* name) {
     OCIEnv* environment = nullptr;
     const sword rc = Call(&ClientLibrary::OCIEnvCreate, &environment, ub4{OCI_OBJECT}, nullptr, nullptr, nullptr,
                           nullptr, size_t{0}, nullptr);
@@ -56,7 +57,7 @@ void LogOn(OCIEnv* environment, OCIError* error, OCISvcCtx* svc, int count, char
 void QuickConnect(const CommandRow&, int count, char** words) {
     if (CheckInUse(Kind::environment, words[1]) || CheckInUse(Kind::error, words[2]) || CheckInUse(Kind::svc, words[3]))
         return;
-    OCIEnv* const environment = MakeEnvironment(words[1]);
+    OCIEnv* const environment = ConnectEnvironment(words[1]);
     if (environment == nullptr) return;
     void* error = nullptr;
     if (!AllocateHandle(environment, OCI_HTYPE_ERROR, error)) return;

@@ -1,4 +1,5 @@
 // Making environments, initialising and ending the library. Memory callbacks say when the library calls them.
+// Command thread only, but for the callbacks, which run in any.
 #include "commands/families.h"
 #include "commands/shared/word_arguments.h"
 #include "core/messages.h"

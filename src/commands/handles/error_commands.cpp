@@ -1,4 +1,4 @@
-// Retrieving diagnostic records by hand, and switching the report of return codes.
+// Retrieving diagnostic records by hand, and switching the report of return codes. Command thread only.
 #include <algorithm>
 #include <string>
 #include <vector>
@@ -25,7 +25,7 @@ void* ResolveDiagnosticHandle(int type, const char* name) {
 }
 
 // What one record is read into. A script may leave out any of the three.
-struct Record {
+struct Diagnostic {
     char state[32] = {};
     sb4 code = 0;
     std::vector<char> text;
@@ -33,7 +33,7 @@ struct Record {
 
     // The library is told the size that the script has typed. The room is larger where that is beyond what a text
     // needs.
-    explicit Record(int typed_size) : text(Room(typed_size)) {}
+    explicit Diagnostic(int typed_size) : text(Room(typed_size)) {}
     static size_t Room(int typed_size) {
         constexpr int kLongestText = 1 << 20;
         if (typed_size < 0) return kLongestText;
@@ -46,7 +46,7 @@ private:
 };
 
 // False after a failed conversion, which has been printed.
-bool Record::PrintState() const {
+bool Diagnostic::PrintState() const {
     constexpr size_t kStateLength = 5;
     std::string shown(state, kStateLength);
     if (Utf16Mode && !convertFromUTF16(state, 2 * kStateLength, shown)) return false;
@@ -56,7 +56,7 @@ bool Record::PrintState() const {
     return true;
 }
 
-void Record::Print() const {
+void Diagnostic::Print() const {
     if (has_state && !PrintState()) return;
     if (has_code) Message(kOutput, "SQLCode: %ld\n", static_cast<long>(code));
     std::string shown;
@@ -69,7 +69,7 @@ void GetError(const CommandRow& row, int count, char** words) {
     void* handle = ResolveDiagnosticHandle(type, words[1]);
     const auto number = static_cast<ub4>(DecodeNumber(words[2]));
     const int size = DecodeNumber(words[3]);
-    Record record(size);
+    Diagnostic record(size);
     if (count == 8) {
         record.has_state = !IsNull(words[5]);
         record.has_code = !IsNull(words[6]);

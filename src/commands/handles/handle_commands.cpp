@@ -1,6 +1,7 @@
 // Allocating and freeing handles, descriptors and arrays of descriptors. Which table an object is entered in follows
 // from its numeric type; a type that has no table is passed to the library all the same, and nothing is entered. Return
 // codes are reported against the environment: the one named or, when freeing, the one the object was made from.
+// Command thread only.
 #include <cstdint>
 #include <cstring>
 #include <optional>

@@ -1,4 +1,5 @@
 // Logging on and off, servers and sessions, versions, breaking a call. Lengths are passed as typed.
+// Command thread only.
 #include <algorithm>
 #include <cstring>
 #include <vector>

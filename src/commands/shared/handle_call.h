@@ -1,4 +1,4 @@
-// Shapes of calls that families share: on one handle, and on a package that an environment holds.
+// Shapes of calls that families share: on one handle, and on a package that an environment holds. Command thread only.
 #pragma once
 
 #include "commands/shared/word_arguments.h"

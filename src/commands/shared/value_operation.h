@@ -1,6 +1,7 @@
 // What the commands on numbers and on dates share: a library function that takes an error handle, some operands and the
 // place of its result. The type of the function says how the words are read and what is done with the result; a row
 // says which function it is. The words are the error handle, one word an operand, and an optional one for the result.
+// Command thread only.
 #pragma once
 
 #include <tuple>

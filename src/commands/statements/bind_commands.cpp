@@ -1,5 +1,5 @@
 // Binds and defines. No address is ever typed: value, indicator, length, return code and current element are those of
-// the buffer or the struct member that a word names.
+// the buffer or the struct member that a word names. Command thread only.
 #include <algorithm>
 #include <optional>
 

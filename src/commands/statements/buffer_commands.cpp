@@ -1,4 +1,4 @@
-// Making, changing, listing and freeing memory buffers.
+// Making, changing, listing and freeing memory buffers. Command thread only.
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>

@@ -1,6 +1,6 @@
 // FetchAllOCI: a whole result set as a table. Every column is defined for a fetch in pieces, and every value is handed
 // the same buffer, piece by piece. The calls inside leave no trace lines. A row is one message; nothing is allocated
-// for it.
+// for it. Command thread only.
 #include <algorithm>
 #include <cstring>
 #include <string>
@@ -23,12 +23,12 @@ bool Failed(sword rc) {
     return rc != OCI_SUCCESS && rc != OCI_SUCCESS_WITH_INFO;
 }
 
-class Table {
+class ResultTable {
 public:
-    explicit Table(OCIStmt* statement) : statement_(statement), error_(DefaultErrorHandle) {}
-    ~Table();
-    Table(const Table&) = delete;
-    Table& operator=(const Table&) = delete;
+    explicit ResultTable(OCIStmt* statement) : statement_(statement), error_(DefaultErrorHandle) {}
+    ~ResultTable();
+    ResultTable(const ResultTable&) = delete;
+    ResultTable& operator=(const ResultTable&) = delete;
 
     // These three answer false when the command ends there, which has been said.
     bool Describe();
@@ -71,13 +71,13 @@ private:
     ub2 return_code_ = 0;
 };
 
-Table::~Table() {
+ResultTable::~ResultTable() {
     for (ub4 column = 0; column < defined_; ++column)
         Call(&ClientLibrary::OCIHandleFree, defines_.get()[column], ub4{OCI_HTYPE_DEFINE});
 }
 
 // Ends the line where it is and reports the call, if it has failed.
-bool Table::Check(sword rc, bool failed) {
+bool ResultTable::Check(sword rc, bool failed) {
     if (!failed) return true;
     line_.Print();
     ReturnCodeReport(error_, rc);
@@ -86,7 +86,7 @@ bool Table::Check(sword rc, bool failed) {
 
 // --- Header ----------------------------------------------------------------------------------------------------------
 
-bool Table::Describe() {
+bool ResultTable::Describe() {
     const sword rc = Call(&ClientLibrary::OCIAttrGet, statement_, ub4{OCI_HTYPE_STMT}, &columns_, nullptr,
                           ub4{OCI_ATTR_PARAM_COUNT}, error_);
     if (!Check(rc, Failed(rc))) return false;
@@ -101,7 +101,7 @@ bool Table::Describe() {
 }
 
 // The size of 1 is no limit: with pieces, the buffer of each tells its own.
-bool Table::DefineColumn(ub4 position) {
+bool ResultTable::DefineColumn(ub4 position) {
     const sword rc = Call(&ClientLibrary::OCIDefineByPos, statement_, &defines_.get()[position - 1], error_, position,
                           buffer_.get(), sb4{1}, ub2{SQLT_STR}, nullptr, nullptr, nullptr, ub4{OCI_DYNAMIC_FETCH});
     if (!Check(rc, Failed(rc))) return false;
@@ -109,7 +109,7 @@ bool Table::DefineColumn(ub4 position) {
     return true;
 }
 
-bool Table::AddColumnName(ub4 position) {
+bool ResultTable::AddColumnName(ub4 position) {
     void* column = nullptr;
     sword rc = Call(&ClientLibrary::OCIParamGet, statement_, ub4{OCI_HTYPE_STMT}, error_, &column, position);
     if (!Check(rc, Failed(rc))) return false;
@@ -121,7 +121,7 @@ bool Table::AddColumnName(ub4 position) {
     return true;
 }
 
-bool Table::PrintHeader() {
+bool ResultTable::PrintHeader() {
     for (ub4 position = 1; position <= columns_; ++position) {
         if (!DefineColumn(position) || !AddColumnName(position)) return false;
         if (position < columns_) line_.Character(',');
@@ -132,22 +132,22 @@ bool Table::PrintHeader() {
     return true;
 }
 
-void Table::PrintUnderline() {
+void ResultTable::PrintUnderline() {
     line_.Text(std::string(width_, '-')).Character('\n').Print();
 }
 
-void Table::PrintFooter() {
+void ResultTable::PrintFooter() {
     PrintUnderline();
     Message(kOutput, "Number of rows fetched - %ld\n", rows_);
 }
 
 // --- Rows ------------------------------------------------------------------------------------------------------------
 
-sword Table::Fetch() {
+sword ResultTable::Fetch() {
     return Call(&ClientLibrary::OCIStmtFetch, statement_, error_, ub4{1}, ub2{OCI_FETCH_NEXT}, ub4{OCI_DEFAULT});
 }
 
-sword Table::AskForPiece() {
+sword ResultTable::AskForPiece() {
     ub1 direction = 0;
     ub4 iteration = 0;
     ub4 index = 0;
@@ -155,7 +155,7 @@ sword Table::AskForPiece() {
                 &iteration, &index, &piece_);
 }
 
-bool Table::ReceivePiece() {
+bool ResultTable::ReceivePiece() {
     length_ = kPieceSize;
     indicator_ = 0;
     const sword rc = Call(&ClientLibrary::OCIStmtSetPieceInfo, define_, define_type_, error_, buffer_.get(), &length_,
@@ -168,13 +168,13 @@ bool Table::ReceivePiece() {
     return true;
 }
 
-void Table::TakePiece() {
+void ResultTable::TakePiece() {
     const char* const text = buffer_.get();
     if (utf16_) value_.append(text, utf::Utf16Length(text, length_));
     else line_.Text({text, strnlen(text, length_)});
 }
 
-void Table::EndValue(ub4 column) {
+void ResultTable::EndValue(ub4 column) {
     if (indicator_ == OCI_IND_NULL) line_.Character('-');
     else if (utf16_) AddText(line_, value_.data(), value_.size(), true, Quotes::never);
     line_.Character(column < columns_ ? ',' : '\n');
@@ -182,7 +182,7 @@ void Table::EndValue(ub4 column) {
 
 // A value that a piece does not hold goes on in the next one. Which value the next piece belongs to is known once it is
 // asked for; behind the last column nothing is, unless the library has more.
-bool Table::ReceiveValue(ub4 column) {
+bool ResultTable::ReceiveValue(ub4 column) {
     value_.clear();
     for (;;) {
         const void* const define = define_;
@@ -199,7 +199,7 @@ bool Table::ReceiveValue(ub4 column) {
     }
 }
 
-bool Table::PrintRow() {
+bool ResultTable::PrintRow() {
     const sword rc = AskForPiece();
     if (!Check(rc, Failed(rc))) return false;
     for (ub4 column = 1; column <= columns_; ++column)
@@ -208,7 +208,7 @@ bool Table::PrintRow() {
     return true;
 }
 
-bool Table::PrintRows(long most_rows) {
+bool ResultTable::PrintRows(long most_rows) {
     for (;;) {
         const sword rc = Fetch();
         if (rc == OCI_ERROR) ReturnCodeReport(error_, rc);
@@ -221,7 +221,7 @@ bool Table::PrintRows(long most_rows) {
 
 void FetchAll(const CommandRow&, int count, char** words) {
     constexpr long kAllRows = 99999999;
-    Table table(Resolve<OCIStmt>(Kind::stmt, words[1]));
+    ResultTable table(Resolve<OCIStmt>(Kind::stmt, words[1]));
     const long most_rows = count > 2 ? DecodeLong(words[2]) : kAllRows;
     if (table.Describe() && table.PrintHeader() && table.PrintRows(most_rows)) table.PrintFooter();
 }

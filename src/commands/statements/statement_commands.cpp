@@ -1,4 +1,5 @@
 // Preparing, executing and releasing statements, fetching, bind information. Lengths are passed as typed.
+// Command thread only.
 #include <algorithm>
 
 #include "commands/families.h"

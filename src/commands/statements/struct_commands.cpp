@@ -1,4 +1,4 @@
-// Making, changing, listing and freeing memory structs.
+// Making, changing, listing and freeing memory structs. Command thread only.
 #include <algorithm>
 #include <cstring>
 #include <vector>

@@ -1,4 +1,4 @@
-// Naming the identifiers of global transactions.
+// Naming the identifiers of global transactions. Command thread only.
 #include <algorithm>
 #include <cstring>
 

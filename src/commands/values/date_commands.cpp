@@ -1,4 +1,4 @@
-// The commands on dates.
+// The commands on dates. Command thread only.
 #include <algorithm>
 #include <cstring>
 

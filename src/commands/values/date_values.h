@@ -1,4 +1,4 @@
-// Dates as the commands write, print and store them.
+// Dates as the commands write, print and store them. Command thread only.
 #pragma once
 
 #include "commands/shared/value_operation.h"

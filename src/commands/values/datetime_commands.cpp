@@ -1,4 +1,5 @@
 // The commands on datetimes, which are named descriptors. All take an environment and an error handle first.
+// Command thread only.
 #include "commands/families.h"
 #include "commands/shared/word_arguments.h"
 #include "commands/values/date_values.h"
@@ -11,7 +12,7 @@ OCIDateTime* FindDateTime(const char* word) {
 }
 
 // A failing read is reported against the default error handle, with which it is read.
-void ShowDateTime(OCIDateTime* datetime) {
+void PrintOrReport(OCIDateTime* datetime) {
     ReturnCodeReport(DefaultErrorHandle, PrintDateTime(datetime));
 }
 
@@ -21,7 +22,7 @@ void RunAssign(const CommandRow& row, int, char** words) {
     OCIDateTime* const to = FindDateTime(words[4]);
     const sword rc = Call(&ClientLibrary::OCIDateTimeAssignNS, handles.environment, handles.error, from, to);
     TraceAndReport(row.code, "", handles.error, rc);
-    if (rc == OCI_SUCCESS) ShowDateTime(to);
+    if (rc == OCI_SUCCESS) PrintOrReport(to);
 }
 
 void RunCheck(const CommandRow& row, int count, char** words) {
@@ -55,7 +56,7 @@ void RunConstruct(const CommandRow& row, int, char** words) {
                           static_cast<ub1>(DecodeNumber(words[8])), static_cast<ub1>(DecodeNumber(words[9])),
                           static_cast<ub4>(DecodeNumber(words[10])), zone.Text(), zone.Length());
     TraceAndReport(row.code, "", handles.error, rc);
-    if (rc == OCI_SUCCESS) ShowDateTime(datetime);
+    if (rc == OCI_SUCCESS) PrintOrReport(datetime);
 }
 
 void RunGetDate(const CommandRow& row, int count, char** words) {
@@ -97,7 +98,7 @@ void RunSetDate(const CommandRow& row, int, char** words) {
                           static_cast<sb2>(DecodeNumber(words[4])), static_cast<ub1>(DecodeNumber(words[5])),
                           static_cast<ub1>(DecodeNumber(words[6])));
     TraceAndReport(row.code, "", handles.error, rc);
-    if (rc == OCI_SUCCESS) ShowDateTime(datetime);
+    if (rc == OCI_SUCCESS) PrintOrReport(datetime);
 }
 
 // What was set is read back and printed, in a form that differs from that of getting in its blanks.

@@ -1,4 +1,4 @@
-// The commands of the library's file package.
+// The commands of the library's file package. Command thread only.
 #include <algorithm>
 
 #include "commands/families.h"

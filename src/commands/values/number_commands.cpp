@@ -1,5 +1,5 @@
 // The commands on numbers that share a handler: a row each. Those that convert have handlers of their own, in
-// number_conversions.cpp.
+// number_conversions.cpp. Command thread only.
 #include "commands/values/number_conversions.h"
 #include "commands/values/number_values.h"
 

@@ -1,4 +1,4 @@
-// Commands that turn numbers into integers, reals and texts and back; each has steps of its own.
+// Commands that turn numbers into integers, reals and texts and back; each has steps of its own. Command thread only.
 #pragma once
 
 #include "core/command_table.h"

@@ -41,7 +41,7 @@ private:
     Memory<char> block_;
 };
 
-sword NumberFromText(OCIError* error, const void* text, ub4 length, const void* format, OCINumber& number) {
+sword ReadNumberText(OCIError* error, const void* text, ub4 length, const void* format, OCINumber& number) {
     const sword rc = Call(&ClientLibrary::OCINumberFromText, error, static_cast<const OraText*>(text), length,
                           static_cast<const OraText*>(format), length, kNoText, ub4{0}, &number);
     if (rc != OCI_SUCCESS) ReturnCodeReport(error, rc);
@@ -54,7 +54,7 @@ int Utf16LiteralToNumber(const char* literal, long length, const char* format, O
     TextArgument wide_format;
     if (!wide_literal.Set(literal, length, TextArea::four_times)) return -1;
     if (!wide_format.Set(format, length, TextArea::four_times)) return -1;
-    return NumberFromText(error, wide_literal.Text(), wide_literal.Length(), wide_format.Text(), number);
+    return ReadNumberText(error, wide_literal.Text(), wide_literal.Length(), wide_format.Text(), number);
 }
 
 int LiteralToNumber(const char* literal, OCIError* error, OCINumber& number) {
@@ -67,7 +67,7 @@ int LiteralToNumber(const char* literal, OCIError* error, OCINumber& number) {
     const char* const format = nines.OfLength(length);
     if (format == nullptr) return -1;
     if (Utf16Mode) return Utf16LiteralToNumber(literal, static_cast<long>(length), format, error, number);
-    return NumberFromText(error, literal, static_cast<ub4>(length), format, number);
+    return ReadNumberText(error, literal, static_cast<ub4>(length), format, number);
 }
 
 // Complains about a buffer of another type.

@@ -1,4 +1,4 @@
-// Row ids as text.
+// Row ids as text. Command thread only.
 #include <algorithm>
 #include <string>
 

@@ -1,4 +1,4 @@
-// The commands on library strings and raws, which come in pairs: a handler serves both.
+// The commands on library strings and raws, which come in pairs: a handler serves both. Command thread only.
 #include "commands/families.h"
 #include "commands/shared/word_arguments.h"
 #include "core/messages.h"
