@@ -12,6 +12,7 @@ constexpr sword kClientVersion[] = {1, 0, 0, 0, 0};
 
 sword OpenEnvironment(OCIEnv** env_out, ub4 mode, const MemoryFunctions& memory, size_t extra, dvoid** extra_out) {
     if (!env_out) return OCI_ERROR;
+    const CallInFlight call;
     Environment* environment = Environment::Open(mode, memory, extra);
     if (!environment) return OCI_ERROR;
     *env_out = AsHandle<OCIEnv>(environment);

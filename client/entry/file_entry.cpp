@@ -1,4 +1,5 @@
-// The file package.
+// The file package: 8 calls, and its initialisation. A file is found once, in the gate's call; its own lock puts the
+// calls of several threads into an order.
 #include <string>
 
 #include "files/file.h"
@@ -54,10 +55,9 @@ Status OpenFile(Environment& environment, OCIFileObject** out, const OraText* na
     const bool standard = type >= OCI_FILE_STDIN && type <= OCI_FILE_STDERR;
     Status named = standard ? Status() : FullName(environment, name, path, full);
     if (!named.Ok()) return named;
-    File* file = Create<File>(environment, 0, 0);
+    Made<File> file(Create<File>(environment, 0, 0));
     Status opened = file->Open(standard ? "standard file" : full, mode, create, type);
-    if (opened.Ok()) *out = AsHandle<OCIFileObject>(file);
-    else Destroy(file);
+    if (opened.Ok()) *out = AsHandle<OCIFileObject>(file.release());
     return opened;
 }
 
@@ -86,9 +86,8 @@ sword OCIFileOpen(dvoid* hndl, OCIError* err, OCIFileObject** out, OraText* name
 // The object is gone even when what it still had to write found no room.
 sword OCIFileClose(dvoid* hndl, OCIError* err, OCIFileObject* file) {
     return EnterFile(hndl, err, file, [](File& open) {
-        Status closed = open.Close();
-        Destroy(&open);
-        return closed;
+        const Made<File> gone(&open);
+        return open.Close();
     });
 }
 

@@ -48,6 +48,7 @@ Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length
 
 sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        const LongCall may_take_long;
         return mode == OCI_DEFAULT ? statement.Fetch(rows, orientation, offset) : Error(errors::kBadMode);
     });
 }
@@ -83,6 +84,7 @@ sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub
                      OCISnapshot*, ub4 mode) {
     return EnterWithError<ServiceContext>(svc, err, [&](ServiceContext& service, ErrorHandle& error) {
         auto* statement = Live<Statement>(stmt);
+        const LongCall may_take_long;
         return statement ? statement->Execute(service, error, {iters, rowoff, mode}) : InvalidHandle();
     });
 }

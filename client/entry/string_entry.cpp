@@ -1,6 +1,6 @@
-// Strings, raws and the text of row ids. Strings and raws differ in their names alone.
+// Strings, raws and the text of row ids. Strings and raws differ in their names alone. A value is not locked: threads
+// that change one at a time are the application's to keep apart.
 #include <cstring>
-#include <memory>
 
 #include "handles/errors.h"
 #include "handles/gate.h"
@@ -13,10 +13,6 @@ template <class Handle> struct ClassOf;
 template <> struct ClassOf<OCIString> { using Type = String; };
 template <> struct ClassOf<OCIRaw> { using Type = Raw; };
 
-struct Destroyer {
-    void operator()(Object* object) const { Destroy(object); }
-};
-
 // Works on the object behind `*place`, or on a new one that is put there when all went well: change(object). A pointer
 // that is no living object is refused like any bad handle.
 template <class Handle, class Change>
@@ -28,7 +24,7 @@ sword ChangeAt(OCIEnv* env, OCIError* err, Handle** place, Change change) {
             T* object = Live<T>(*place);
             return object ? change(*object) : InvalidHandle();
         }
-        std::unique_ptr<T, Destroyer> made(Create<T>(environment, 0, 0));
+        Made<T> made(Create<T>(environment, 0, 0));
         Status changed = change(*made);
         if (changed.Ok()) *place = AsHandle<Handle>(made.release());
         return changed;
@@ -44,10 +40,11 @@ sword AssignBytes(OCIEnv* env, OCIError* err, const void* source, ub4 length, Ha
 
 template <class Handle>
 sword AssignObject(OCIEnv* env, OCIError* err, const Handle* source, Handle** place) {
-    using T = typename ClassOf<Handle>::Type;
-    const T* from = Live<T>(source);
-    if (source && !from) return Enter<Environment>(env, err, [](Environment&) { return InvalidHandle(); });
-    return ChangeAt(env, err, place, [from](Variable& target) { return target.Assign(from ? from->View() : ""); });
+    return ChangeAt(env, err, place, [source](Variable& target) {
+        if (!source) return target.Assign("");
+        const Variable* from = Live<typename ClassOf<Handle>::Type>(source);
+        return from ? target.Assign(*from) : InvalidHandle();
+    });
 }
 
 // A size of 0 frees the object.
@@ -60,7 +57,7 @@ sword Resize(OCIEnv* env, OCIError* err, ub4 size, Handle** place) {
         if (!*place) return {};
         T* object = Live<T>(*place);
         if (!object) return InvalidHandle();
-        Destroy(object);
+        if (!Destroy(object)) return InvalidHandle();
         *place = nullptr;
         return {};
     });

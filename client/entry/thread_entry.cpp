@@ -61,7 +61,7 @@ sword Unmake(void* handle, OCIError* err, Handle** place, Check check) {
         Status status = Find(*place, object);
         if (status.Ok()) status = check(*object);
         if (!status.Ok()) return status;
-        Destroy(object);
+        if (!Destroy(object)) return InvalidHandle();    // another thread has
         *place = nullptr;
         return {};
     });

@@ -9,6 +9,7 @@
 #include <cerrno>
 #include <limits>
 #include <system_error>
+#include <utility>
 
 #include "handles/errors.h"
 #include "oci_constants.h"
@@ -54,8 +55,14 @@ bool IsDirectory(int descriptor) {
 
 }  // namespace
 
-File::~File() {
-    if (stream_) (void)Close();
+File::~File() { (void)GiveUpStream(); }
+
+// The calls on an open file, one at a time: body().
+template <class Body>
+Status File::InTurn(Body body) {
+    const LongCall wait;
+    const std::lock_guard lock(mutex_);
+    return stream_ ? body() : Error(errors::kInvalidFileObject);
 }
 
 Status File::Use(std::FILE* stream, std::uint32_t mode, bool standard) {
@@ -74,6 +81,7 @@ Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t cre
     if (type == OCI_FILE_STDERR) return Use(stderr, OCI_FILE_WRITE_ONLY, true);
     if (mode < OCI_FILE_READ_ONLY || mode > OCI_FILE_READ_WRITE) return InvalidArgument("unknown open mode");
     if (create & ~kAllCreateFlags) return InvalidArgument("unknown create flag");
+    const LongCall wait;    // for the other end of a pipe
     const int descriptor = open(name.c_str(), OpenFlags(mode, create), 0666);
     if (descriptor < 0) return SystemError(name, errno);
     if (IsDirectory(descriptor)) {
@@ -89,13 +97,20 @@ Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t cre
     return Use(stream, mode, false);
 }
 
-Status File::Close() {
-    const std::lock_guard lock(mutex_);
-    std::FILE* stream = stream_;
-    stream_ = nullptr;
+int File::GiveUpStream() noexcept {
+    std::FILE* stream = std::exchange(stream_, nullptr);
+    if (!stream) return 0;
     errno = 0;
     const bool failed = standard_ ? writable_ && std::fflush(stream) != 0 : std::fclose(stream) != 0;
-    return failed ? SystemError(name_, errno) : Status();
+    if (!failed) return 0;
+    return errno != 0 ? errno : EIO;
+}
+
+Status File::Close() {
+    return InTurn([this] {
+        const int error = GiveUpStream();
+        return error != 0 ? SystemError(name_, error) : Status();
+    });
 }
 
 void File::Turn(Last next) {
@@ -104,47 +119,51 @@ void File::Turn(Last next) {
 }
 
 Status File::Read(void* buffer, std::uint32_t size, std::uint32_t* count) {
-    const std::lock_guard lock(mutex_);
-    if (!readable_) return Error(errors::kAccessDenied, name_ + ": not open for reading");
-    Turn(Last::read);
-    errno = 0;
-    *count = static_cast<std::uint32_t>(std::fread(buffer, 1, size, stream_));
-    const bool failed = *count < size && std::ferror(stream_);
-    const int error = errno;
-    if (*count < size) std::clearerr(stream_);    // what is appended later can still be read
-    return failed ? SystemError(name_, error) : Status();
+    return InTurn([&]() -> Status {
+        if (!readable_) return Error(errors::kAccessDenied, name_ + ": not open for reading");
+        Turn(Last::read);
+        errno = 0;
+        *count = static_cast<std::uint32_t>(std::fread(buffer, 1, size, stream_));
+        const bool failed = *count < size && std::ferror(stream_);
+        const int error = errno;
+        if (*count < size) std::clearerr(stream_);    // what is appended later can still be read
+        return failed ? SystemError(name_, error) : Status();
+    });
 }
 
 Status File::Write(const void* data, std::uint32_t size, std::uint32_t* count) {
-    const std::lock_guard lock(mutex_);
-    if (!writable_) return Error(errors::kAccessDenied, name_ + ": not open for writing");
-    Turn(Last::write);
-    errno = 0;
-    *count = static_cast<std::uint32_t>(std::fwrite(data, 1, size, stream_));
-    if (*count == size) return {};
-    const int error = errno;
-    std::clearerr(stream_);
-    return SystemError(name_, error);
+    return InTurn([&]() -> Status {
+        if (!writable_) return Error(errors::kAccessDenied, name_ + ": not open for writing");
+        Turn(Last::write);
+        errno = 0;
+        *count = static_cast<std::uint32_t>(std::fwrite(data, 1, size, stream_));
+        if (*count == size) return {};
+        const int error = errno;
+        std::clearerr(stream_);
+        return SystemError(name_, error);
+    });
 }
 
 Status File::Seek(std::uint32_t origin, std::uint64_t offset, int direction) {
-    const std::lock_guard lock(mutex_);
-    if (origin < OCI_FILE_SEEK_BEGINNING || origin > OCI_FILE_SEEK_END) return InvalidArgument("unknown seek origin");
-    const bool forward = direction == OCI_FILE_FORWARD;
-    if (!forward && direction != OCI_FILE_BACKWARD) return InvalidArgument("unknown seek direction");
-    if (offset > std::uint64_t{std::numeric_limits<std::int64_t>::max()}) return InvalidArgument("offset too large");
-    constexpr int kOrigins[] = {0, SEEK_SET, SEEK_CUR, SEEK_END};
-    const auto distance = static_cast<off_t>(offset);
-    last_ = Last::other;
-    if (fseeko(stream_, forward ? distance : -distance, kOrigins[origin]) == 0) return {};
-    return SystemError(name_, errno);
+    return InTurn([&]() -> Status {
+        if (origin < OCI_FILE_SEEK_BEGINNING || origin > OCI_FILE_SEEK_END) return InvalidArgument("unknown seek origin");
+        const bool forward = direction == OCI_FILE_FORWARD;
+        if (!forward && direction != OCI_FILE_BACKWARD) return InvalidArgument("unknown seek direction");
+        if (offset > std::uint64_t{std::numeric_limits<std::int64_t>::max()}) return InvalidArgument("offset too large");
+        constexpr int kOrigins[] = {0, SEEK_SET, SEEK_CUR, SEEK_END};
+        const auto distance = static_cast<off_t>(offset);
+        last_ = Last::other;
+        if (fseeko(stream_, forward ? distance : -distance, kOrigins[origin]) == 0) return {};
+        return SystemError(name_, errno);
+    });
 }
 
 Status File::Flush() {
-    const std::lock_guard lock(mutex_);
-    if (!writable_) return {};
-    errno = 0;
-    return std::fflush(stream_) == 0 ? Status() : SystemError(name_, errno);
+    return InTurn([&]() -> Status {
+        if (!writable_) return {};
+        errno = 0;
+        return std::fflush(stream_) == 0 ? Status() : SystemError(name_, errno);
+    });
 }
 
 Status FileExists(const std::string& name, bool* exists) {

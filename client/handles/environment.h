@@ -49,6 +49,7 @@ public:
 
 private:
     friend class ObjectTree;
+    friend class RetiredObjects;
     Environment(const Origin& origin, std::uint32_t mode, const MemoryFunctions& memory);
 
     void Close() noexcept;    // the end of its own memory
@@ -57,12 +58,10 @@ private:
     bool utf16_;
     bool threaded_;
     MemoryFunctions memory_;
-    std::mutex tree_mutex_;    // links between this environment's objects
+    std::mutex tree_mutex_;              // links between this environment's objects
+    std::uint64_t freed_objects_ = 0;    // not destroyed yet; under the mutex of the retired objects, as the next
+    bool freed_ = false;                 // it is itself, and waits for them
 };
-
-inline SerialLock::SerialLock(Object& object) {
-    if (object.Env().Threaded()) Lock(object.Serial());
-}
 
 // Blocks the library holds in all environments.
 std::int64_t HeldBlocks() noexcept;

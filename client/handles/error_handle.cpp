@@ -40,7 +40,8 @@ void ErrorList::List(const Status& status) noexcept try {
     if (alone > 0) records_.push_back({alone, Status::kClient, {}});
     records_.push_back({status.Number(), status.Engine(), status.Detail()});
 } catch (const std::bad_alloc&) {
-    // The return code still tells of the failure.
+    int none = kNone;
+    state_.compare_exchange_strong(none, status.Number(), std::memory_order_relaxed);
 }
 
 void ErrorList::TakeFrom(ErrorList& other) noexcept {

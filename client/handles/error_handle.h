@@ -19,8 +19,9 @@ std::string_view SqlState(int number) noexcept;
 // "[KELP/<ENGINE>] ORA-nnnnn: <text>", then ": " and the engine's own words where it had some, and a line feed.
 std::string ErrorMessage(int number, std::string_view engine, std::string_view detail);
 
-// The records of the last call. Recording formats nothing: texts are put together when they are asked for. Threads that
-// share a list see each other's records, but nothing worse.
+// The records of the last call. Recording formats nothing: texts are put together when they are asked for. The first
+// record always finds room: without memory it is kept without the words of its own. Threads that share a list see each
+// other's records, but nothing worse.
 class ErrorList {
 public:
     struct Record {
@@ -34,7 +35,7 @@ public:
         if (state == kListed) Empty();
         else if (state != kNone) state_.store(kNone, std::memory_order_relaxed);
     }
-    // Nothing for a status without a number. Without memory the record is lost.
+    // Nothing for a status without a number. Without memory a further record is lost.
     void Add(const Status& status) noexcept {
         if (status.Number() == 0) return;
         if (status.Plain() && state_.load(std::memory_order_relaxed) == kNone) {

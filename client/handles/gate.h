@@ -1,6 +1,8 @@
 // The gate that every exported function passes: marks the call as in flight, checks the error handle and the object
 // (null, foreign and freed pointers get OCI_INVALID_HANDLE and no record), empties the records, runs the body, turns
-// what it answers or throws into a record and the return code. Bodies answer a Status and may throw.
+// what it answers or throws into a record and the return code. Bodies answer a Status and may throw. Every pointer is
+// looked up once, and inside the call in flight: what it gives lives until the call's end, whoever frees it. What a body
+// looks up beside the gate's object is not locked by the gate.
 //
 //   sword OCIPing(OCISvcCtx* svchp, OCIError* errhp, ub4) {
 //       return Enter<ServiceContext>(svchp, errhp, [](ServiceContext& service) { return service.Ping(); });
@@ -23,18 +25,29 @@ inline sword Record(ErrorList& list, const Status& status) noexcept {
     return status.Code();
 }
 
+// What is being thrown, as an error; without its words where they find no memory.
+inline Status Caught() noexcept try {
+    throw;
+} catch (const std::bad_alloc&) {
+    return Error(errors::kOutOfMemory);
+} catch (const std::exception& failure) {
+    try {
+        return Error(errors::kInternalError, failure.what());
+    } catch (...) {
+        return Error(errors::kInternalError);
+    }
+} catch (...) {
+    return Error(errors::kInternalError);
+}
+
 // Runs a body and records into `list`.
 template <class Body>
 sword Guard(ErrorList& list, Body&& body) noexcept {
     try {
         const Status status = body();
         return status.Ok() ? OCI_SUCCESS : Record(list, status);
-    } catch (const std::bad_alloc&) {
-        return Record(list, Error(errors::kOutOfMemory));
-    } catch (const std::exception& failure) {
-        return Record(list, Error(errors::kInternalError, failure.what()));
     } catch (...) {
-        return Record(list, Error(errors::kInternalError));
+        return Record(list, Caught());
     }
 }
 
@@ -74,9 +87,9 @@ sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
     error->list.Clear();
-    const Kind kind = live::KindOf(handle);
-    if (kind != Kind::environment && kind != Kind::session) return OCI_INVALID_HANDLE;
-    return Guard(error->list, [&] { return body(Live<Object>(handle)->Env()); });
+    const Object* target = LiveOneOf(handle, Kind::environment, Kind::session);
+    if (!target) return OCI_INVALID_HANDLE;
+    return Guard(error->list, [&] { return body(target->Env()); });
 }
 
 // Calls that have nothing but a parent environment; what goes wrong is recorded there: body(Environment&).

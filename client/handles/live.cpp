@@ -1,10 +1,14 @@
-// Writing into the set of living objects. Readers take no lock: a slot is a pair of atomics, a table that grew is
-// published anew and the old one kept, since a reader may still be looking at it. Writers hold a mutex.
-#include <atomic>
-#include <memory>
-#include <vector>
+// Writing into the set of living objects.
+//
+// How much memory it takes: a table is at most half full and has at most eight words a living object when it is made
+// (1024 at least). One that is replaced is freed at the next replacement, unless a call that looks up has been running
+// since: so there are one table or two, and further ones only while such a call runs.
+#include "handles/live.h"
 
-#include "handles/object.h"
+#include <cassert>
+#include <memory>
+#include <mutex>
+#include <vector>
 
 namespace live {
 namespace {
@@ -14,10 +18,11 @@ constexpr unsigned kFirstBits = 10;
 // A table and the slots that it owns.
 struct OwnedTable {
     explicit OwnedTable(unsigned bits)
-        : slots(new Slot[std::size_t{1} << bits]), table{64 - bits, (std::size_t{1} << bits) - 1, slots.get()} {}
+        : slots(new Slot[std::size_t{1} << bits]{}), table{64 - bits, (std::size_t{1} << bits) - 1, slots.get()} {}
 
     const std::unique_ptr<Slot[]> slots;
     const Table table;
+    in_flight::Epoch retired = 0;    // once it is replaced
 };
 
 constinit Slot no_slots[2];
@@ -26,35 +31,39 @@ constinit const Table kNoObjects{63, 1, no_slots};
 // What only writers touch.
 struct Writer {
     std::mutex mutex;
-    std::vector<std::unique_ptr<OwnedTable>> tables;    // the last is in use, the others are retired
+    std::vector<std::unique_ptr<OwnedTable>> tables;    // the last is in use, the others are replaced
     std::size_t living = 0;
-    std::size_t occupied = 0;    // living or erased slots
+    std::size_t occupied = 0;    // living or erased words
 
     [[nodiscard]] const Table& InUse() const { return tables.empty() ? kNoObjects : tables.back()->table; }
 };
 
-// Never destroyed: objects may be freed while the process ends.
-Writer& TheWriter() {
-    static auto* writer = new Writer;
-    return *writer;
-}
+// Never destroyed: objects may be freed while the process ends. Nor made, which would need memory.
+union Undying {
+    constexpr Undying() : writer() {}
+    ~Undying() {}
+    Writer writer;
+};
+constinit Undying undying;
 
-void Put(const Table& table, Key key, Kind kind, std::size_t& occupied) {
-    std::size_t index = table.Home(key);
+Writer& TheWriter() { return undying.writer; }
+
+void Put(const Table& table, Word word, std::size_t& occupied) {
+    std::size_t index = table.Home(AddressIn(word));
     for (;; index = table.Next(index)) {
-        const Key found = table.slots[index].key.load(std::memory_order_relaxed);
+        const Word found = table.slots[index].load(std::memory_order_relaxed);
         if (found == kEmpty) ++occupied;
         if (found == kEmpty || found == kErased) break;
     }
-    table.slots[index].kind.store(kind, std::memory_order_relaxed);
-    table.slots[index].key.store(key, std::memory_order_release);
+    table.slots[index].store(word, std::memory_order_release);
 }
 
-// The slot of a key; null when the table has it not.
-Slot* FindSlot(const Table& table, Key key) {
-    for (std::size_t index = table.Home(key);; index = table.Next(index)) {
-        const Key found = table.slots[index].key.load(std::memory_order_relaxed);
-        if (found == key) return &table.slots[index];
+// The slot of an object; null when the table has it not.
+Slot* FindSlot(const Table& table, const void* pointer) {
+    const Word address = AddressOf(pointer);
+    for (std::size_t index = table.Home(address);; index = table.Next(index)) {
+        const Word found = table.slots[index].load(std::memory_order_relaxed);
+        if (AddressIn(found) == address && found != kEmpty) return &table.slots[index];
         if (found == kEmpty) return nullptr;
     }
 }
@@ -65,20 +74,20 @@ unsigned BitsFor(std::size_t living) {
     return bits;
 }
 
-// Publishes a table with room for one more: larger when many live, else only rid of erased slots.
+// Publishes a table with room for one more: larger when many live, else only rid of erased words.
 void Rebuild(Writer& writer) {
     auto owned = std::make_unique<OwnedTable>(BitsFor(writer.living + 1));
     writer.tables.reserve(writer.tables.size() + 1);
     std::size_t occupied = 0;
     const Table& old = writer.InUse();
     for (std::size_t index = 0; index <= old.mask; ++index) {
-        const Key key = old.slots[index].key.load(std::memory_order_relaxed);
-        if (key != kEmpty && key != kErased) {
-            Put(owned->table, key, old.slots[index].kind.load(std::memory_order_relaxed), occupied);
-        }
+        const Word word = old.slots[index].load(std::memory_order_relaxed);
+        if (word != kEmpty && word != kErased) Put(owned->table, word, occupied);
     }
     writer.occupied = occupied;
     current.store(&owned->table, std::memory_order_release);
+    std::erase_if(writer.tables, [](const auto& table) { return table->retired && in_flight::AllLeft(table->retired); });
+    if (!writer.tables.empty()) writer.tables.back()->retired = in_flight::Retire();
     writer.tables.push_back(std::move(owned));
 }
 
@@ -89,37 +98,38 @@ constinit std::atomic<const Table*> current{&kNoObjects};
 void Insert(const void* pointer, Kind kind) {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
-    if (writer.tables.empty() || (writer.occupied + 1) * 2 > writer.tables.back()->table.mask) Rebuild(writer);
-    Put(writer.tables.back()->table, reinterpret_cast<Key>(pointer), kind, writer.occupied);
+    if (writer.tables.empty() || (writer.occupied + 1) * 2 > writer.InUse().mask) Rebuild(writer);
+    assert(AddressOf(pointer) >> (64 - kKindBits) == 0);
+    Put(writer.InUse(), AddressOf(pointer) << kKindBits | static_cast<Word>(kind), writer.occupied);
     ++writer.living;
 }
 
 void Retype(const void* pointer, Kind kind) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
-    Slot* slot = FindSlot(writer.InUse(), reinterpret_cast<Key>(pointer));
-    if (slot) slot->kind.store(kind, std::memory_order_release);
+    Slot* slot = FindSlot(writer.InUse(), pointer);
+    if (slot) slot->store(AddressOf(pointer) << kKindBits | static_cast<Word>(kind), std::memory_order_release);
 }
 
 bool Contains(const void* pointer) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
-    return FindSlot(writer.InUse(), reinterpret_cast<Key>(pointer)) != nullptr;
+    return FindSlot(writer.InUse(), pointer) != nullptr;
 }
 
 bool Erase(const void* pointer) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
     const Table& table = writer.InUse();
-    Slot* slot = FindSlot(table, reinterpret_cast<Key>(pointer));
+    Slot* slot = FindSlot(table, pointer);
     if (!slot) return false;
-    slot->key.store(kErased, std::memory_order_release);
+    slot->store(kErased, std::memory_order_release);
     --writer.living;
     auto index = static_cast<std::size_t>(slot - table.slots);
-    if (table.slots[table.Next(index)].key.load(std::memory_order_relaxed) != kEmpty) return true;
-    // No search passes here any more: the erased slots that end this run become empty.
-    for (; table.slots[index].key.load(std::memory_order_relaxed) == kErased; index = table.Previous(index)) {
-        table.slots[index].key.store(kEmpty, std::memory_order_release);
+    if (table.slots[table.Next(index)].load(std::memory_order_relaxed) != kEmpty) return true;
+    // No search passes here any more: the erased words that end this run become empty.
+    for (; table.slots[index].load(std::memory_order_relaxed) == kErased; index = table.Previous(index)) {
+        table.slots[index].store(kEmpty, std::memory_order_release);
         --writer.occupied;
     }
     return true;

@@ -4,12 +4,6 @@
 #include "handles/environment.h"
 #include "handles/in_flight.h"
 
-namespace {
-
-constinit thread_local bool destroying = false;    // this thread is, and what it destroys destroys others
-
-}  // namespace
-
 std::string& Object::KeptText(std::uint32_t attribute) {
     for (auto& [kept, text] : kept_texts_) {
         if (kept == attribute) return text;
@@ -17,9 +11,31 @@ std::string& Object::KeptText(std::uint32_t attribute) {
     return kept_texts_.emplace_back(attribute, std::string()).second;
 }
 
-void SerialLock::Lock(std::shared_ptr<std::recursive_mutex> mutex) {
-    if (mutex) mutex->lock();
+// While it waits the object may have gone over to another mutex.
+SerialLock::SerialLock(Object& object) {
+    if (!object.Env().Threaded()) return;
+    while (Lock(object.Serial()) && object.Serial() != mutex_) Unlock();
+}
+
+SerialLock::SerialLock(Object& object, std::try_to_lock_t) {
+    if (object.Env().Threaded()) mutex_ = object.Serial();
+    owns_ = !mutex_ || mutex_->try_lock();
+}
+
+SerialLock::~SerialLock() { Unlock(); }
+
+bool SerialLock::Lock(Mutex mutex) {
     mutex_ = std::move(mutex);
+    if (!mutex_ || mutex_->try_lock()) return false;
+    const LongCall wait;
+    mutex_->lock();
+    return true;
+}
+
+void SerialLock::Unlock() noexcept {
+    if (!mutex_ || !owns_) return;
+    mutex_->unlock();
+    in_flight::GaveUpLock();
 }
 
 void* ObjectTree::Reserve(Environment& environment, std::size_t size) { return environment.Allocate(size); }
@@ -28,6 +44,7 @@ void ObjectTree::Unreserve(Environment& environment, void* memory) noexcept { en
 
 void ObjectTree::Adopt(Object& object, Kind kind, std::size_t extra) {
     Environment& environment = object.Env();
+    object.born_ = in_flight::Now();
     void* user_memory = extra > 0 ? environment.Allocate(extra) : nullptr;
     try {
         Link(object, kind);
@@ -36,6 +53,7 @@ void ObjectTree::Adopt(Object& object, Kind kind, std::size_t extra) {
         throw;
     }
     object.user_memory_ = user_memory;
+    if (in_flight::Closed()) in_flight::Close();    // the LongCall knows it, too
 }
 
 // What hangs below an object that another thread has just withdrawn is never found, and goes with it.
@@ -64,30 +82,27 @@ bool ObjectTree::Withdraw(Object& object) noexcept {
     return was_living;
 }
 
-// What dies with something else dies at once: nothing below it is found any more. Of the threads that destroy the same
-// object, the one that withdraws it goes on; what was withdrawn with its parent goes with that.
+// Of the threads that destroy the same object, the one that withdraws it goes on.
 bool ObjectTree::Destroy(Object* object) noexcept {
     {
         const std::lock_guard lock(object->Env().tree_mutex_);
-        if (!destroying && !Withdraw(*object)) return false;
+        if (!Withdraw(*object)) return false;
         Unlink(*object);
     }
-    if (destroying || in_flight::MayDestroy(*object)) DestroyTree(object);
+    in_flight::Retire(*object);
     return true;
 }
 
-// The youngest child first: what was made later may lean on what was made before.
+// The youngest child first: what was made later may lean on what was made before. Nobody knows the object or what hangs
+// below it: the links need no lock any more.
 void ObjectTree::DestroyTree(Object* object) noexcept {
-    const bool outermost = !std::exchange(destroying, true);
-    live::Erase(object);    // of what dies with something else, nobody has withdrawn it yet
-    while (Object* child = object->first_child_) Destroy(child);
+    while (Object* child = object->first_child_) {
+        Unlink(*child);
+        DestroyTree(child);
+    }
     Environment& environment = object->Env();
     environment.Release(object->user_memory_);
-    if (object == static_cast<Object*>(&environment)) {
-        environment.Close();
-    } else {
-        object->~Object();
-        environment.Release(object);
-    }
-    if (outermost) destroying = false;
+    if (object == static_cast<Object*>(&environment)) return environment.Close();
+    object->~Object();
+    environment.Release(object);
 }

@@ -2,7 +2,8 @@
 //
 // An object belongs to an environment and hangs below a parent (the environment, a statement, a describe handle, ...):
 // destroying the parent destroys it. Its memory comes from the environment. What the application passes in is checked
-// by Live, which asks the set of living objects and never reads the memory behind an unknown pointer.
+// by Live, which asks the set of living objects and never reads the memory behind an unknown pointer. Objects are looked
+// up and used inside a call in flight (in_flight.h says for how long); what they hold is guarded by their serial mutex.
 #pragma once
 
 #include <atomic>
@@ -16,19 +17,12 @@
 #include <utility>
 #include <vector>
 
+#include "handles/live.h"
+
 class Environment;
 struct AttributeRow;
 
 using TypeCode = std::uint32_t;    // OCI_HTYPE_* or OCI_DTYPE_*; 0 for objects that have neither
-
-// One value for each class that Live can ask for. A class may serve several type codes.
-enum class Kind : std::uint8_t {
-    none,
-    environment, error, service_context, statement, bind, define, describe, server, session, transaction,
-    connection_pool, session_pool, plain_handle, descriptor_array,
-    lob, snapshot, result_set, parameter, row_id, datetime, interval, plain_descriptor,
-    string, raw, file, thread_mutex, thread_key, thread_id, thread_handle
-};
 
 class Object;
 
@@ -76,25 +70,34 @@ private:
     Object* first_child_ = nullptr;
     Object* previous_ = nullptr;
     Object* next_ = nullptr;
-    std::uint64_t retired_ = 0;    // the epoch, once it is
+    in_flight::Epoch born_ = 0;       // its epochs (in_flight.h)
+    in_flight::Epoch retired_ = 0;    // once it is
     void* user_memory_ = nullptr;
     std::vector<std::pair<std::uint32_t, std::string>> kept_texts_;
     TypeCode type_;
 };
 
-// Held while a call on an object runs, which may destroy the object; nothing in environments without threads.
+// Held while a call on an object runs, which may destroy the object; nothing in environments without threads. Who waits
+// for it keeps nothing that others free meanwhile.
 class SerialLock {
 public:
+    using Mutex = std::shared_ptr<std::recursive_mutex>;
+
     explicit SerialLock(Object& object);
-    explicit SerialLock(std::shared_ptr<std::recursive_mutex> mutex) { Lock(std::move(mutex)); }
-    ~SerialLock() { if (mutex_) mutex_->unlock(); }
+    explicit SerialLock(Mutex mutex) { Lock(std::move(mutex)); }
+    SerialLock(Object& object, std::try_to_lock_t);    // waits for nothing
+    ~SerialLock();
     SerialLock(const SerialLock&) = delete;
     SerialLock& operator=(const SerialLock&) = delete;
 
-private:
-    void Lock(std::shared_ptr<std::recursive_mutex> mutex);
+    [[nodiscard]] bool Owns() const { return owns_; }
 
-    std::shared_ptr<std::recursive_mutex> mutex_;
+private:
+    bool Lock(Mutex mutex);    // true when it had to wait
+    void Unlock() noexcept;
+
+    Mutex mutex_;
+    bool owns_ = true;    // there is no mutex, or it is locked
 };
 
 // Makes and destroys objects; the links between them are the tree's alone. Safe from several threads.
@@ -105,8 +108,8 @@ public:
     static void Unreserve(Environment& environment, void* memory) noexcept;
     // Hangs the object below its parent and makes it live. Throws std::bad_alloc and changes nothing then.
     static void Adopt(Object& object, Kind kind, std::size_t extra);
-    // Destroys the object and all below it; later, when another thread is inside a call. False when another thread has
-    // done so meanwhile: it or what it hangs below.
+    // Destroys the object and all below it, or has it destroyed when the last call that may know it has ended. False
+    // when it is destroyed or waits for that already, or goes with what it hangs below.
     static bool Destroy(Object* object) noexcept;
 
 private:
@@ -118,52 +121,6 @@ private:
     static void DestroyTree(Object* object) noexcept;
 };
 
-// The set of living objects: a hash table from pointer to kind. KindOf takes no lock and reads nothing but the table;
-// it is inline, since every call of the library asks at least once.
-namespace live {
-
-using Key = std::uintptr_t;
-constexpr Key kEmpty = 0;
-constexpr Key kErased = 1;    // no object lies there
-
-struct Slot {
-    std::atomic<Key> key{kEmpty};
-    std::atomic<Kind> kind{Kind::none};
-};
-
-struct Table {
-    unsigned shift;
-    std::size_t mask;
-    Slot* slots;
-
-    [[nodiscard]] std::size_t Home(Key key) const {
-        return static_cast<std::size_t>((key * std::uint64_t{0x9E3779B97F4A7C15}) >> shift);
-    }
-    [[nodiscard]] std::size_t Next(std::size_t index) const { return (index + 1) & mask; }
-    [[nodiscard]] std::size_t Previous(std::size_t index) const { return (index - 1) & mask; }
-};
-
-extern constinit std::atomic<const Table*> current;    // never null
-
-// Kind::none when it is no living object.
-inline Kind KindOf(const void* pointer) noexcept {
-    const Key key = reinterpret_cast<Key>(pointer);
-    if (key <= kErased) return Kind::none;
-    const Table& table = *current.load(std::memory_order_acquire);
-    for (std::size_t index = table.Home(key);; index = table.Next(index)) {
-        const Key found = table.slots[index].key.load(std::memory_order_acquire);
-        if (found == key) return table.slots[index].kind.load(std::memory_order_relaxed);
-        if (found == kEmpty) return Kind::none;
-    }
-}
-
-void Insert(const void* pointer, Kind kind);    // throws std::bad_alloc and changes nothing then
-bool Erase(const void* pointer) noexcept;       // false when it is not in the set
-// Nothing for an object that another thread has erased. As Kind::none an object stays in the set, but is not found.
-void Retype(const void* pointer, Kind kind) noexcept;
-bool Contains(const void* pointer) noexcept;    // of any kind, Kind::none too
-}  // namespace live
-
 // The living T behind a pointer, or null. T::kKind says its kind; Live<Object> takes any.
 template <class T>
 T* Live(const void* pointer) noexcept {
@@ -174,6 +131,12 @@ T* Live(const void* pointer) noexcept {
         if (kind == Kind::none) return nullptr;
     }
     return static_cast<T*>(static_cast<Object*>(const_cast<void*>(pointer)));
+}
+
+// The living object of one of two kinds, looked up once.
+inline Object* LiveOneOf(const void* pointer, Kind one, Kind other) noexcept {
+    const Kind kind = live::KindOf(pointer);
+    return kind == one || kind == other ? static_cast<Object*>(const_cast<void*>(pointer)) : nullptr;
 }
 
 // Makes a T below `parent` with `extra` bytes of user memory (zeroed). Throws std::bad_alloc.
@@ -194,6 +157,13 @@ T* Create(Object& parent, TypeCode type, std::size_t extra, Arguments&&... argum
 }
 
 inline bool Destroy(Object* object) noexcept { return ObjectTree::Destroy(object); }
+
+// Owns an object that nobody has been given yet, or that is to go whatever happens.
+struct Destroyer {
+    void operator()(Object* object) const noexcept { Destroy(object); }
+};
+template <class T>
+using Made = std::unique_ptr<T, Destroyer>;
 
 // The pointer that the application gets: AsHandle<OCIStmt>(statement).
 template <class Handle>

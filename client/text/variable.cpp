@@ -1,8 +1,8 @@
 // Strings and raws: their memory.
 #include "text/variable.h"
 
-#include <algorithm>
 #include <cstring>
+#include <utility>
 
 #include "handles/environment.h"
 #include "handles/errors.h"
@@ -16,20 +16,23 @@ constexpr std::size_t kTerminator = 2;
 
 Variable::~Variable() { Env().Release(data_); }
 
-void Variable::Replace(std::uint32_t room, std::string_view content) {
+// The content is looked at when the memory functions have been called, and the old block given back when it is no longer
+// this value's.
+template <class Content>
+void Variable::Replace(std::uint32_t room, Content content) {
     auto* block = static_cast<char*>(Env().Allocate(room + kTerminator));
-    if (!content.empty()) std::memcpy(block, content.data(), content.size());
-    std::memset(block + content.size(), 0, kTerminator);
-    Env().Release(data_);
-    data_ = block;
-    size_ = static_cast<std::uint32_t>(content.size());
+    const std::string_view kept = std::string_view(content()).substr(0, room);
+    if (!kept.empty()) std::memcpy(block, kept.data(), kept.size());
+    std::memset(block + kept.size(), 0, kTerminator);
+    size_ = static_cast<std::uint32_t>(kept.size());
     room_ = room;
+    Env().Release(std::exchange(data_, block));
 }
 
 Status Variable::Assign(std::string_view content) {
     if (content.size() > kLargest) return Error(errors::kSizeTooLarge);
     if (!data_ || content.size() > room_) {
-        Replace(static_cast<std::uint32_t>(content.size()), content);
+        Replace(static_cast<std::uint32_t>(content.size()), [content] { return content; });
         return {};
     }
     if (!content.empty()) std::memmove(data_, content.data(), content.size());
@@ -38,8 +41,14 @@ Status Variable::Assign(std::string_view content) {
     return {};
 }
 
+Status Variable::Assign(const Variable& other) {
+    if (data_ && other.size_ <= room_) return Assign(other.View());
+    Replace(other.size_, [&other] { return other.View(); });
+    return {};
+}
+
 Status Variable::Resize(std::uint32_t size) {
     if (size > kLargest) return Error(errors::kSizeTooLarge);
-    Replace(size, View().substr(0, std::min<std::size_t>(size, size_)));
+    Replace(size, [this] { return View(); });
     return {};
 }

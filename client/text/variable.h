@@ -1,6 +1,7 @@
 // Strings and raws: values of any length that the library keeps for the application. They belong to their environment
 // and their memory comes from it. A string holds its text in the application's form: UTF-16 where the environment has
-// that.
+// that. Nothing locks: threads do not change a value at a time. The memory functions, which are called in the middle of
+// a change, may change or free any value, this one too.
 #pragma once
 
 #include <cstdint>
@@ -20,14 +21,17 @@ public:
     [[nodiscard]] std::uint32_t Room() const { return room_; }    // never below the size
     [[nodiscard]] std::string_view View() const { return {data_, size_}; }
 
-    // Copies `content`, which may be part of this value. Error 22140 for what is too long; throws std::bad_alloc.
+    // Copies what the application holds. Error 22140 for what is too long; throws std::bad_alloc.
     Status Assign(std::string_view content);
+    // Copies another value, or this one.
+    Status Assign(const Variable& other);
     // Makes the room `size` bytes; of the content stays what fits.
     Status Resize(std::uint32_t size);
 
 private:
-    // Takes a new block of `room` bytes for `content`, which fits and may be part of the old one.
-    void Replace(std::uint32_t room, std::string_view content);
+    // Changes to a new block of `room` bytes with what content() says then, cut to that room.
+    template <class Content>
+    void Replace(std::uint32_t room, Content content);
 
     char* data_ = nullptr;    // null until something is assigned
     std::uint32_t size_ = 0;

@@ -1,6 +1,6 @@
-// Threads. Each thread of the process that meets the package gets a record: who it is, and its values of keys. The
-// records are kept by the system's own thread-specific data, whose destructor runs when a thread ends, but not for the
-// main thread when the process does.
+// Threads. Each thread of the process that meets the package gets a record: who it is, and its values of keys. A record
+// is its thread's alone. It ends by the system's own thread-specific data, whose destructor runs when a thread ends, but
+// not for the main thread when the process does.
 #include "threads/thread.h"
 
 #include "handles/errors.h"
@@ -73,23 +73,27 @@ private:
     std::vector<KeyValue> values_;
 };
 
-void EndRecord(void* record);
+constinit thread_local ThreadRecord* own_record = nullptr;
 
-pthread_key_t RecordKey() {
-    static const pthread_key_t key = [] {
-        pthread_key_t made{};
-        if (pthread_key_create(&made, EndRecord) != 0) throw std::bad_alloc();
-        return made;
-    }();
-    return key;
-}
-
-// The functions of keys may use the package: the record, which the system has taken away, stands until they are done.
+// The functions of keys may use the package: the record stands until they are done.
 void EndRecord(void* given) {
     const std::unique_ptr<ThreadRecord> record(static_cast<ThreadRecord*>(given));
-    pthread_setspecific(RecordKey(), given);
+    own_record = record.get();
     record->DestroyValues();
-    pthread_setspecific(RecordKey(), nullptr);
+    own_record = nullptr;
+}
+
+struct RecordKey {
+    pthread_key_t key{};
+    const bool made = pthread_key_create(&key, EndRecord) == 0;
+};
+
+// False, without the memory for it, when the thread's end will not end the record.
+bool AttachRecord(ThreadRecord& record) {
+    static const RecordKey key;
+    if (!key.made || pthread_setspecific(key.key, &record) != 0) return false;
+    own_record = &record;
+    return true;
 }
 
 std::shared_ptr<ThreadState> NewState() {
@@ -98,14 +102,11 @@ std::shared_ptr<ThreadState> NewState() {
     return state;
 }
 
-ThreadRecord& AttachRecord(std::unique_ptr<ThreadRecord> record) {
-    if (pthread_setspecific(RecordKey(), record.get()) != 0) throw std::bad_alloc();
-    return *record.release();
-}
-
 ThreadRecord& CurrentRecord() {
-    if (auto* record = static_cast<ThreadRecord*>(pthread_getspecific(RecordKey()))) return *record;
-    return AttachRecord(std::make_unique<ThreadRecord>(NewState()));
+    if (own_record) return *own_record;
+    auto record = std::make_unique<ThreadRecord>(NewState());
+    if (!AttachRecord(*record)) throw std::bad_alloc();
+    return *record.release();
 }
 
 struct Start {
@@ -116,8 +117,11 @@ struct Start {
 
 void* RunThread(void* given) {
     std::unique_ptr<Start> start(static_cast<Start*>(given));
-    AttachRecord(std::move(start->record));
+    ThreadRecord* record = start->record.release();
+    const bool attached = AttachRecord(*record);
+    own_record = record;
     start->routine(start->argument);
+    if (!attached) EndRecord(record);
     return nullptr;
 }
 
@@ -141,6 +145,7 @@ Status ThreadMutex::Acquire() {
     const std::uint64_t self = CurrentThread()->number;
     std::unique_lock lock(guard_);
     if (owner_ == self) return Misuse("the mutex is held by this thread already");
+    const LongCall wait;
     released_.wait(lock, [this] { return owner_ == 0; });
     owner_ = self;
     return {};
@@ -186,6 +191,7 @@ Status ThreadHandle::Join() {
     std::unique_lock lock(state->mutex);
     if (state->joined) return Misuse("the thread is joined already");
     state->joined = true;
+    const LongCall wait;
     state->ended_condition.wait(lock, [&state] { return state->ended; });
     return {};
 }
