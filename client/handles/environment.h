@@ -63,6 +63,10 @@ private:
     bool freed_ = false;                 // it is itself, and waits for them
 };
 
+inline SerialLock::SerialLock(Object& object) {
+    if (object.Env().Threaded()) LockThreaded(object);
+}
+
 // Blocks the library holds in all environments.
 std::int64_t HeldBlocks() noexcept;
 

@@ -33,12 +33,13 @@ std::string ErrorMessage(int number, std::string_view engine, std::string_view d
 }
 
 void ErrorList::List(const Status& status) noexcept try {
+    Record record{status.Number(), status.Engine(), status.Detail()};
     const std::lock_guard lock(mutex_);
-    records_.reserve(records_.size() + 2);
+    records_.reserve(records_.size() + 2);    // nothing fails below
     const int alone = state_.exchange(kListed, std::memory_order_relaxed);
     if (alone != kListed) records_.clear();    // what a thread listed while another emptied the list
     if (alone > 0) records_.push_back({alone, Status::kClient, {}});
-    records_.push_back({status.Number(), status.Engine(), status.Detail()});
+    records_.push_back(std::move(record));
 } catch (const std::bad_alloc&) {
     int none = kNone;
     state_.compare_exchange_strong(none, status.Number(), std::memory_order_relaxed);

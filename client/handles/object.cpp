@@ -12,8 +12,7 @@ std::string& Object::KeptText(std::uint32_t attribute) {
 }
 
 // While it waits the object may have gone over to another mutex.
-SerialLock::SerialLock(Object& object) {
-    if (!object.Env().Threaded()) return;
+void SerialLock::LockThreaded(Object& object) {
     while (Lock(object.Serial()) && object.Serial() != mutex_) Unlock();
 }
 
@@ -21,8 +20,6 @@ SerialLock::SerialLock(Object& object, std::try_to_lock_t) {
     if (object.Env().Threaded()) mutex_ = object.Serial();
     owns_ = !mutex_ || mutex_->try_lock();
 }
-
-SerialLock::~SerialLock() { Unlock(); }
 
 bool SerialLock::Lock(Mutex mutex) {
     mutex_ = std::move(mutex);
@@ -33,7 +30,7 @@ bool SerialLock::Lock(Mutex mutex) {
 }
 
 void SerialLock::Unlock() noexcept {
-    if (!mutex_ || !owns_) return;
+    if (!owns_) return;
     mutex_->unlock();
     in_flight::GaveUpLock();
 }

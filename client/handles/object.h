@@ -86,13 +86,14 @@ public:
     explicit SerialLock(Object& object);
     explicit SerialLock(Mutex mutex) { Lock(std::move(mutex)); }
     SerialLock(Object& object, std::try_to_lock_t);    // waits for nothing
-    ~SerialLock();
+    ~SerialLock() { if (mutex_) Unlock(); }
     SerialLock(const SerialLock&) = delete;
     SerialLock& operator=(const SerialLock&) = delete;
 
     [[nodiscard]] bool Owns() const { return owns_; }
 
 private:
+    void LockThreaded(Object& object);
     bool Lock(Mutex mutex);    // true when it had to wait
     void Unlock() noexcept;
 
