@@ -190,6 +190,27 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
     EXPECT_EQ(OCIServerVersion(server, err_, nullptr, 0, OCI_HTYPE_SERVER), OCI_ERROR);
 }
 
+// A call whose error handle is good has emptied it, whatever else it is given.
+TEST_F(CallsTest, RecordsOfTheCallBeforeAreGoneWhenTheObjectIsNone) {
+    OCISvcCtx* svc = NewHandle<OCISvcCtx>(env_, OCI_HTYPE_SVCCTX);
+    auto* none = reinterpret_cast<dvoid*>(&svc);
+    const std::function<sword()> calls[] = {
+        [&] { return OCIPing(static_cast<OCISvcCtx*>(none), err_, 0); },
+        [&] { return OCIAttrGet(none, OCI_HTYPE_SVCCTX, &svc, nullptr, OCI_ATTR_ENV, err_); },
+        [&] { return OCIAttrGet(svc, OCI_HTYPE_STMT, &none, nullptr, OCI_ATTR_ENV, err_); },
+        [&] { return OCIThreadInit(none, err_); },
+        [&] { return OCISessionEnd(svc, err_, static_cast<OCISession*>(none), 0); },
+        [&] {
+            auto* string = static_cast<OCIString*>(none);
+            return OCIStringResize(env_, err_, 1, &string);
+        }};
+    for (std::size_t call = 0; call < std::size(calls); ++call) {
+        ASSERT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
+        EXPECT_EQ(calls[call](), OCI_INVALID_HANDLE) << call;
+        EXPECT_EQ(FirstCode(err_), 0) << call;
+    }
+}
+
 TEST_F(CallsTest, ErrorTextIsCutAndTerminatedInAnyBuffer) {
     OCISvcCtx* svc = NewHandle<OCISvcCtx>(env_, OCI_HTYPE_SVCCTX);
     ASSERT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);

@@ -1,6 +1,9 @@
 // What becomes of objects that are freed while calls run: by callbacks of the call itself, by other threads, beside a
 // call that waits for long. Memory must not go too early, and not stay too long.
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include <atomic>
 #include <chrono>
@@ -254,6 +257,28 @@ TEST_F(BesideAWait, ForAMutex) {
             EXPECT_EQ(OCIThreadMutexRelease(env_, wait_err_, mutex), OCI_SUCCESS);
         },
         [&] { EXPECT_EQ(OCIThreadMutexRelease(env_, err_, mutex), OCI_SUCCESS); });
+}
+
+TEST_F(BesideAWait, ForAPipe) {
+    const std::string name = "/tmp/kelp-pipe-" + std::to_string(getpid());
+    ASSERT_EQ(mkfifo(name.c_str(), 0600), 0);
+    ASSERT_EQ(OCIFileInit(env_, err_), OCI_SUCCESS);
+    OCIFileObject* file = nullptr;
+    auto* path = reinterpret_cast<OraText*>(const_cast<char*>(name.c_str()));
+    const int other_end = open(name.c_str(), O_RDWR);
+    ASSERT_EQ(OCIFileOpen(env_, err_, &file, path, nullptr, OCI_FILE_READ_ONLY, OCI_FILE_EXIST, OCI_FILE_BIN), 0);
+    MakeAndFree(
+        [&] {
+            char byte = 0;
+            ub4 count = 0;
+            EXPECT_EQ(OCIFileRead(env_, wait_err_, file, &byte, 1, &count), OCI_SUCCESS);
+            EXPECT_EQ(byte, 'k');
+        },
+        [&] { EXPECT_EQ(write(other_end, "k", 1), 1); });
+    EXPECT_EQ(OCIFileClose(env_, err_, file), OCI_SUCCESS);
+    close(other_end);
+    unlink(name.c_str());
+    EXPECT_EQ(OCIFileTerm(env_, err_), OCI_SUCCESS);
 }
 
 // One thread runs the query, a second one waits for its turn on the same session.

@@ -3,8 +3,13 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <atomic>
+#include <chrono>
 #include <filesystem>
 #include <fstream>
+#include <functional>
+#include <thread>
+#include <vector>
 
 #include "support/call_fixture.h"
 
@@ -229,6 +234,49 @@ TEST_F(FileCalls, OpenFilesAreWrittenWhenTheEnvironmentGoes) {
     EXPECT_EQ(Write(file, "buffered"), 0);
     Reopen(OCI_DEFAULT);
     EXPECT_EQ(FileContents("late"), "buffered");
+}
+
+// A thread waits in a read from a pipe, another in a close behind it, further ones behind that: the close is done once,
+// and who comes after it is told.
+TEST_F(FileCalls, ClosedWhileOthersWaitForTheirTurn) {
+    const std::string pipe = folder_ + "/pipe";
+    ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
+    const int other_end = open(pipe.c_str(), O_RDWR);
+    OCIFileObject* file = nullptr;
+    char data[8];
+    ub4 count = 0;
+    const std::function<sword(OCIError*)> calls[] = {
+        [&](OCIError* err) { return OCIFileRead(env_, err, file, data, 1, &count); },
+        [&](OCIError* err) { return OCIFileClose(env_, err, file); },
+        [&](OCIError* err) { return OCIFileSeek(env_, err, file, OCI_FILE_SEEK_BEGINNING, 1, OCI_FILE_FORWARD); },
+        [&](OCIError* err) { return OCIFileClose(env_, err, file); },
+        [&](OCIError* err) { return OCIFileRead(env_, err, file, data + 1, 1, &count); },
+        [&](OCIError* err) { return OCIFileFlush(env_, err, file); }};
+    for (int round = 0; round < 10; ++round) {
+        file = MustOpen("pipe", OCI_FILE_READ_ONLY, OCI_FILE_EXIST);
+        std::atomic<int> closed{0}, told{0};
+        std::vector<std::thread> threads;
+        for (const auto& call : calls) {
+            const bool closes = &call == &calls[1] || &call == &calls[3];
+            threads.emplace_back([&, closes] {
+                dvoid* err = nullptr;
+                sb4 number = 0;
+                OCIHandleAlloc(env_, &err, OCI_HTYPE_ERROR, 0, nullptr);
+                const sword rc = call(static_cast<OCIError*>(err));
+                if (rc != OCI_SUCCESS) OCIErrorGet(err, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
+                closed += closes && rc == OCI_SUCCESS;
+                told += number == 30153;
+                OCIHandleFree(err, OCI_HTYPE_ERROR);
+            });
+            std::this_thread::sleep_for(std::chrono::milliseconds(3));
+        }
+        EXPECT_EQ(write(other_end, "kk", 2), 2);    // one byte each for the two that may read
+        for (std::thread& thread : threads) thread.join();
+        EXPECT_EQ(closed, 1) << "round " << round;
+        EXPECT_GE(told, 1) << "round " << round;
+        EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 30153);
+    }
+    close(other_end);
 }
 
 TEST_F(FileCalls, NothingWorksOutsideOfThePackage) {
