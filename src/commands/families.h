@@ -10,6 +10,7 @@ void AddBufferCommands(HandlerTable& handlers);
 void AddConvenienceCommands(HandlerTable& handlers);
 void AddDateCommands(HandlerTable& handlers);
 void AddDateTimeCommands(HandlerTable& handlers);
+void AddDynamicCommands(HandlerTable& handlers);
 void AddEnvironmentCommands(HandlerTable& handlers);
 void AddErrorCommands(HandlerTable& handlers);
 void AddFetchAllCommand(HandlerTable& handlers);
@@ -32,6 +33,7 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddConvenienceCommands,
     AddDateCommands,
     AddDateTimeCommands,
+    AddDynamicCommands,
     AddEnvironmentCommands,
     AddErrorCommands,
     AddFetchAllCommand,

@@ -98,6 +98,20 @@ MemBuffer* FindBuffer(const char* name) {
     return buffer;
 }
 
+uint32_t LengthOf(const MemBuffer& buffer, uint32_t index) {
+    const DynamicData& dynamic = buffer.dynamic;
+    if (dynamic.lengths_count == 0) return *buffer.Length(index);
+    const uint32_t previous = dynamic.previous_lengths == nullptr ? 0 : dynamic.previous_lengths[index];
+    return previous + (dynamic.piece_lengths == nullptr ? 0 : dynamic.piece_lengths[index]);
+}
+
+void ForgetPieces(const MemBuffer& buffer, uint32_t index) {
+    const DynamicData& dynamic = buffer.dynamic;
+    if (dynamic.previous_lengths == nullptr || dynamic.piece_lengths == nullptr) return;
+    dynamic.previous_lengths[index] = *buffer.Length(index);
+    dynamic.piece_lengths[index] = 0;
+}
+
 bool HoldsPointers(int type) {
     constexpr int kTypes[] = {SQLT_LVB, SQLT_CUR, SQLT_CLOB, SQLT_BLOB, SQLT_RSET, SQLT_VST,
                               SQLT_DATE, SQLT_TIMESTAMP, SQLT_TIMESTAMP_TZ, SQLT_TIMESTAMP_LTZ};

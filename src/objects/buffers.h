@@ -92,6 +92,11 @@ uint32_t ElementSize(int type, uint32_t given, uint32_t precision);
 // Makes an element of a number type zero; those of other types stay as they are. False when that failed.
 bool SetZero(const ElementShape& shape, unsigned char* element);
 
+// How long an element is: what its length says or, where values come in pieces, the sum of what came in.
+uint32_t LengthOf(const MemBuffer& buffer, uint32_t index);
+// Pieces that came in before no longer tell how long an element is.
+void ForgetPieces(const MemBuffer& buffer, uint32_t index);
+
 // Whether elements of the type hold a pointer.
 bool HoldsPointers(int type);
 

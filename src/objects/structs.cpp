@@ -103,12 +103,6 @@ std::string ViewName(const MemStruct& record, long index) {
     return record.name + std::string(kViewMark) + std::to_string(index);
 }
 
-MemBuffer* FindView(const MemStruct& record, uint32_t index) {
-    for (MemBuffer& buffer : Buffers())
-        if (buffer.in_use && buffer.viewed == &record && buffer.viewed_member == index) return &buffer;
-    return nullptr;
-}
-
 MemBuffer* MakeView(MemStruct& record, uint32_t index) {
     MemBuffer* const view = OccupySlot(Kind::buffer, Buffers(), ViewName(record, index).c_str());
     if (view == nullptr) return nullptr;
@@ -198,10 +192,16 @@ StructMember* SelectMember(MemStruct& record, long index, long row) {
     return &record.members[index];
 }
 
-MemBuffer* ViewOf(MemStruct& record, const StructMember& member) {
+MemBuffer* FindView(const MemStruct& record, const StructMember& member) {
     const auto index = static_cast<uint32_t>(&member - record.members);
-    MemBuffer* const view = FindView(record, index);
-    return view != nullptr ? view : MakeView(record, index);
+    for (MemBuffer& buffer : Buffers())
+        if (buffer.in_use && buffer.viewed == &record && buffer.viewed_member == index) return &buffer;
+    return nullptr;
+}
+
+MemBuffer* ViewOf(MemStruct& record, const StructMember& member) {
+    MemBuffer* const view = FindView(record, member);
+    return view != nullptr ? view : MakeView(record, static_cast<uint32_t>(&member - record.members));
 }
 
 MemBuffer* FindBufferOrView(const char* word) {

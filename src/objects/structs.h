@@ -52,6 +52,8 @@ ViewPlaces PlacesOf(const MemStruct& record, const StructMember& member, uint32_
 // struct without the row "Invalid array index into struct - %ld\n"; both give null.
 StructMember* SelectMember(MemStruct& record, long index, long row = 0);
 
+// The view of a member if there is one.
+MemBuffer* FindView(const MemStruct& record, const StructMember& member);
 // The view of a member, found or made. Null when the buffer table is full, which has been said.
 MemBuffer* ViewOf(MemStruct& record, const StructMember& member);
 

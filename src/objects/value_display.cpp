@@ -257,13 +257,6 @@ struct DisplayIndex {
 };
 constexpr DisplayIndex kDisplayIndex;
 
-uint32_t LengthOf(const MemBuffer& buffer, uint32_t index) {
-    const DynamicData& dynamic = buffer.dynamic;
-    if (dynamic.lengths_count == 0) return *buffer.Length(index);
-    const uint32_t previous = dynamic.previous_lengths == nullptr ? 0 : dynamic.previous_lengths[index];
-    return previous + (dynamic.piece_lengths == nullptr ? 0 : dynamic.piece_lengths[index]);
-}
-
 bool HasValue(const ElementView& element) {
     constexpr int kNullIndicator = -1;
     return element.indicator != kNullIndicator && (element.return_code == 0 || element.return_code == 1);

@@ -11,7 +11,7 @@
 //   POSITION[+OFFSET]=TYPE:VALUE   what stands at POSITION, counted from 1, is an output to fill, OFFSET bytes behind its
 //                                  beginning: TYPE is i1, i2, i4, i8 for integers by width, f8 for a double, t for a
 //                                  terminated text, b for bytes in hexadecimal, p and x for a pointer to such a text and
-//                                  such bytes, h for a pointer to a new object
+//                                  such bytes, h for a pointer to a new object or, with a number, to that one
 //   POSITION?TYPE                  records what stands at POSITION: i1 to i8; tN, N characters; p, the text or texts
 //                                  that pointers there lead to, up to a null pointer
 //   call:KIND:ARGUMENT...          calls what the driver has installed and records what it gave (CallBack says how)
@@ -362,6 +362,13 @@ void* MakeObject(State& state) {
     return object;
 }
 
+// The object that records call h and the number.
+const void* Object(const State& state, const std::string& number) {
+    for (const auto& [object, its_number] : state.objects)
+        if (its_number == std::stoul(number)) return object;
+    return nullptr;
+}
+
 void HandOut(State& state, const std::vector<Argument>& arguments) {
     for (const Argument& argument : arguments) {
         if (argument.form != Argument::place) continue;
@@ -389,6 +396,7 @@ void Fill(State& state, const Output& output, const std::vector<Argument>& argum
     else if (output.type == "f8") Store(place, std::stod(output.value));
     else if (output.type == "p") Store(place, KeepText(output.value));
     else if (output.type == "x") Store(place, KeepText(Bytes(output.value)));
+    else if (output.type == "h" && !output.value.empty()) Store(place, Object(state, output.value));
     else if (output.type == "h") Store(place, MakeObject(state));
     else if (output.type == "b") std::memcpy(const_cast<char*>(place), KeepText(Bytes(output.value)), output.value.size() / 2);
     else std::memcpy(const_cast<char*>(place), output.value.c_str(), output.value.size() + 1);

@@ -71,6 +71,7 @@ void UpdateElement(const CommandRow&, int, char** words) {
                                   buffer->precision,
                                   buffer->scale};
     if (!AssignText(target, words[3], DecodeNumber(words[4]))) return;
+    ForgetPieces(*buffer, element);
     Message(kOutput, "UpdateMemOCI: memory buffer %s updated.\n", words[1]);
 }
 

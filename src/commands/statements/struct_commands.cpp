@@ -83,6 +83,7 @@ void UpdateMember(const CommandRow&, int, char** words) {
                                   places.indicator,                  places.length,      places.return_code,
                                   shape.precision,                   shape.scale};
     if (!AssignText(target, words[4], DecodeNumber(words[5]))) return;
+    if (const MemBuffer* const view = FindView(*record, *member)) ForgetPieces(*view, static_cast<uint32_t>(row));
     Message(kOutput, "UpdateMemStructOCI: memory struct %s updated.\n", words[1]);
 }
 
@@ -92,12 +93,14 @@ ElementView ViewMember(const MemStruct& record, const StructMember& member, uint
     constexpr uint32_t kPointerLength = 8;
     const ElementShape& shape = member.shape;
     const ViewPlaces places = PlacesOf(record, member, row);
+    const MemBuffer* const view = FindView(record, member);
+    const uint32_t length = view == nullptr ? *places.length : LengthOf(*view, row);
     return {.type = static_cast<uint16_t>(shape.type),
             .data = places.value,
             .size = shape.size,
             .indicator = *places.indicator,
             .return_code = *places.return_code,
-            .length = HoldsPointers(shape.type) ? kPointerLength : *places.length,
+            .length = HoldsPointers(shape.type) ? kPointerLength : length,
             .precision = shape.precision,
             .scale = shape.scale,
             .utf16 = utf16};
