@@ -1,5 +1,8 @@
 // Making environments, initialising and ending the library. Memory callbacks say when the library calls them.
 // Command thread only, but for the callbacks, which run in any.
+#include <algorithm>
+#include <optional>
+
 #include "commands/families.h"
 #include "commands/shared/word_arguments.h"
 #include "core/messages.h"
@@ -44,8 +47,6 @@ struct Callbacks {
     OCIFreeFunction free = nullptr;
 };
 
-constexpr int kCallbackWords = 4;  // "ctxp mallocp reallocp freep": only the first one's text matters
-
 void* ContextOf(const char* word) {
     if (IsInvalid(word)) return InvalidObject();
     return IsNull(word) ? nullptr : my_context;
@@ -53,21 +54,36 @@ void* ContextOf(const char* word) {
 
 // --- Environments ----------------------------------------------------------------------------------------------------
 
-// The words after the mode: extramem and null, or the four of the callbacks and then those.
-constexpr int kFirstOption = 3;
-constexpr int kFewestWithCallbacks = kFirstOption + kCallbackWords;
+// A form of a line: its word count, and where the words behind the mode stand.
+struct EnvironmentForm {
+    int count;
+    std::optional<int> context;  // the first of "ctxp mallocp reallocp freep", and the only one whose text matters
+    std::optional<int> extra;    // where "[extramem [null]]" would stand; without, the library is given no place
+    bool size_is_read = true;
+};
+constexpr EnvironmentForm kEnvironmentForms[] = {
+    {.count = 3, .context = {}, .extra = {}},
+    {.count = 4, .context = {}, .extra = 3},
+    {.count = 5, .context = {}, .extra = 3},
+    {.count = 7, .context = 3, .extra = 7},
+    {.count = 8, .context = 3, .extra = 7},
+    // In its longest form the command does not read the extramem word. It never has, and scripts count on it.
+    {.count = 9, .context = 3, .extra = 7, .size_is_read = false},
+};
 
-Callbacks CallbacksOf(int count, char** words) {
-    if (count < kFewestWithCallbacks) return {};
-    return {ContextOf(words[kFirstOption]), MyMalloc, MyRealloc, MyFree};
+const EnvironmentForm& FormOf(int count) {
+    return *std::ranges::find(kEnvironmentForms, count, &EnvironmentForm::count);
 }
 
-ExtraMemory ExtraMemoryOf(int count, char** words) {
-    if (count == kFirstOption) return ExtraMemory::None();
-    const int first = count < kFewestWithCallbacks ? kFirstOption : kFewestWithCallbacks;
-    ExtraMemory extra(count - first, words + first);
-    // In its longest form the command does not read the extramem word. It never has, and scripts count on it.
-    if (count == kFewestWithCallbacks + 2) extra.DropSize();
+Callbacks CallbacksOf(const EnvironmentForm& form, char** words) {
+    if (!form.context) return {};
+    return {ContextOf(words[*form.context]), MyMalloc, MyRealloc, MyFree};
+}
+
+ExtraMemory ExtraMemoryOf(const EnvironmentForm& form, char** words) {
+    if (!form.extra) return ExtraMemory::None();
+    ExtraMemory extra(form.count - *form.extra, words + *form.extra);
+    if (!form.size_is_read) extra.DropSize();
     return extra;
 }
 
@@ -81,8 +97,9 @@ void MakeEnvironment(const EnvironmentMaker& row, int count, char** words) {
     NewObject<OCIEnv> environment(words[1]);
     const ub4 mode = DecodeMode(words[2]);
     if ((mode & OCI_UTF16) != 0) Utf16Mode = true;
-    ExtraMemory extra = ExtraMemoryOf(count, words);
-    const sword rc = row.make(environment.Place(), mode, CallbacksOf(count, words), extra);
+    const EnvironmentForm& form = FormOf(count);
+    ExtraMemory extra = ExtraMemoryOf(form, words);
+    const sword rc = row.make(environment.Place(), mode, CallbacksOf(form, words), extra);
     outputOCI(row.code, rc, words[1]);
     EnvironmentReport(environment.Get(), rc);
     if (rc != OCI_SUCCESS) return;
@@ -104,6 +121,15 @@ constexpr EnvironmentMaker kEnvironmentMakers[] = {
      },
      false},
 };
+
+// Whether every count that the dispatcher lets through has a form.
+constexpr bool HasForms(const EnvironmentMaker& maker) {
+    for (int count = 0; count < 64; ++count)
+        if (maker.words.Has(count) && std::ranges::count(kEnvironmentForms, count, &EnvironmentForm::count) != 1)
+            return false;
+    return true;
+}
+static_assert(std::ranges::all_of(kEnvironmentMakers, HasForms));
 
 // --- The process -----------------------------------------------------------------------------------------------------
 
