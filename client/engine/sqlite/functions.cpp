@@ -24,19 +24,31 @@
 namespace engine::sqlite {
 namespace {
 
+void ReturnStored(sqlite3_context* context, Column column, sqlite3_value* argument) {
+    OCINumber number;
+    Datum value = ReadDatum(argument, number);
+    Coercion coercion(std::move(column));
+    const Status status = coercion.Apply(value);
+    if (status.Failed()) Refuse(context, status);
+    else ReturnDatum(context, value);
+}
+
+// binary_float(x), binary_double(x)
+template <std::uint16_t type>
+void ToBinary(sqlite3_context* context, int, Arguments arguments) {
+    Column column;
+    column.type = type;
+    ReturnStored(context, std::move(column), arguments[0]);
+}
+
 // number(x), number(x, precision), number(x, precision, scale)
 void ToNumber(sqlite3_context* context, int count, Arguments arguments) {
-    OCINumber number;
-    Datum value = ReadDatum(arguments[0], number);
     Column column;
     ReadDeclaredType("number", column);
     if (count > 1) column.precision = static_cast<std::uint8_t>(std::clamp(sqlite3_value_int(arguments[1]), 1, 38));
     if (count > 1) column.scale = 0;
     if (count > 2) column.scale = static_cast<std::int8_t>(std::clamp(sqlite3_value_int(arguments[2]), -84, 126));
-    Coercion coercion(std::move(column));
-    const Status status = coercion.Apply(value);
-    if (status.Failed()) Refuse(context, status);
-    else ReturnDatum(context, value);
+    ReturnStored(context, std::move(column), arguments[0]);
 }
 
 // decfloat(x), decfloat(x, digits): rounded to 34 or 16 digits
@@ -143,6 +155,8 @@ void Coerce(sqlite3_context* context, int, Arguments arguments) {
 constexpr FunctionRow kFunctionRows[] = {
     {"kelp_number", 1, 3, SQLITE_DETERMINISTIC, ToNumber},
     {"kelp_decfloat", 1, 2, SQLITE_DETERMINISTIC, ToDecimalFloat},
+    {"kelp_binary_float", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBFLOAT>},
+    {"kelp_binary_double", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBDOUBLE>},
     {"kelp_varchar", 1, 2, SQLITE_DETERMINISTIC, ToText<false, Unit::bytes>},
     {"kelp_varchar_chars", 1, 2, SQLITE_DETERMINISTIC, ToText<false, Unit::characters>},
     {"kelp_nvarchar", 1, 2, SQLITE_DETERMINISTIC, ToText<false, Unit::characters>},

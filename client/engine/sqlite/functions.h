@@ -17,6 +17,8 @@ inline constexpr Dialect::Spelling kCasts[] = {
     {"numeric", "kelp_number"},
     {"decimal", "kelp_number"},
     {"dec", "kelp_number"},
+    {"binary_float", "kelp_binary_float"},
+    {"binary_double", "kelp_binary_double"},
     {"varchar2", "kelp_varchar"},
     {"varchar", "kelp_varchar"},
     {"nvarchar2", "kelp_nvarchar"},

@@ -325,6 +325,9 @@ TEST_F(SqliteDescribes, NativeFloatsAndDoubles) {
     EXPECT_EQ(columns[1], (Described{"D", SQLT_IBDOUBLE, 8, 0, 0, 0, false}));
     EXPECT_EQ(columns[2].type, SQLT_IBDOUBLE);
     EXPECT_EQ(Rows("select f, d from t"), "16777216,.1;");
+    EXPECT_EQ(Rows("select cast(16777217 as binary_float), cast('16777217' as binary_double), "
+                   "cast(null as binary_float) from dual"), "16777216,16777217,-;");
+    EXPECT_EQ(Rows("select cast(1e39 as binary_float) from dual"), "!1426");
 }
 
 TEST_F(SqliteDescribes, SizesInCharactersAndInBytes) {
