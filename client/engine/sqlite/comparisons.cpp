@@ -94,12 +94,19 @@ public:
     }
 
 private:
-    // A table of the statement, where it is named.
+    // A table or subquery of the statement, where it is named.
     struct Table {
         std::size_t scope = 0;
         bool is_target = false;    // of an insert
         std::string name;          // its alias, if it has one
         std::vector<TableColumn> columns;
+        std::size_t query = 0;                  // where a subquery begins; 0: a table
+        std::vector<std::string_view> names;    // of a subquery's columns, where WITH tells them
+    };
+    struct With {
+        std::string name;
+        std::size_t query = 0;
+        std::vector<std::string_view> names;
     };
 
     std::string_view At(std::size_t index) const { return operands_.At(index); }
@@ -131,8 +138,8 @@ private:
             for (std::size_t index = 0; index < lefts.size(); ++index) Compare(lefts[index], rights[index]);
             return;
         }
-        if (const TableColumn* column = TypeOf(left)) Use(right, *column);
-        else if (const TableColumn* other = TypeOf(right)) Use(left, *other);
+        if (const TableColumn* column = ConcerningType(left)) Use(right, *column);
+        else if (const TableColumn* other = ConcerningType(right)) Use(left, *other);
     }
 
     Span Subject(std::size_t at) const { return operands_.Before(IsWord(At(at - 1), "not") ? at - 1 : at); }
@@ -162,11 +169,17 @@ private:
         }
     }
 
-    // The column that an expression is, or one of the type of the date that it answers; null for anything else.
+    // The column that an expression is, or one of the type of the date that it answers; null for anything else, and
+    // where the column's type does not matter to what it is compared with.
+    const TableColumn* ConcerningType(Span span) {
+        const TableColumn* column = TypeOf(span);
+        return column && column->concerned && Coercion::ConcernsComparison(column->column) ? column : nullptr;
+    }
+
     const TableColumn* TypeOf(Span span) {
         span = operands_.Bare(span);
         if (span.Size() == 0 || operands_.IsValue(span)) return nullptr;
-        if (operands_.IsColumn(span)) return Concerning(Resolve(span));
+        if (operands_.IsColumn(span)) return Resolve(span);
         if (!IsName(At(span.first))) return nullptr;
         const ExpressionType type = ReadType({pieces_.begin() + static_cast<std::ptrdiff_t>(span.first),
                                               pieces_.begin() + static_cast<std::ptrdiff_t>(span.last)});
@@ -185,10 +198,6 @@ private:
             column = &answers_.back();
         }
         return column && IsDateType(column->column.type) ? column : nullptr;
-    }
-
-    static const TableColumn* Concerning(const TableColumn* column) {
-        return column && column->concerned && Coercion::ConcernsComparison(column->column) ? column : nullptr;
     }
 
     // What is compared with a column. A date takes anything but other columns and queries; columns of other types take
@@ -239,39 +248,123 @@ private:
 
     // ---- Names
 
-    // The column of a name: of the table that the name says, or of those of the innermost query that has one so called;
-    // else of any table, as behind a subquery or WITH.
+    // What a name is found to be. A column of a subquery that is calculated is found, and is no table's column.
+    struct Found {
+        bool any = false;
+        const TableColumn* column = nullptr;
+    };
+
     const TableColumn* Resolve(Span name) {
         if (scopes_.empty()) ReadTables();
-        const std::string_view column = At(name.last - 1);
         const std::string qualifier = name.Size() > 1 ? PlainName(At(name.last - 3)) : std::string();
+        if (depth_ == 0) looks_ = 0;
+        return FindName(At(name.last - 1), qualifier, scopes_[name.first]).column;
+    }
+
+    // A column of the table that the qualifier says, or of those of the innermost query that has one so called; else of
+    // any table, as behind what is not understood.
+    Found FindName(std::string_view column, const std::string& qualifier, std::size_t scope) {
         const auto is_meant = [&](const Table& table) {
             return qualifier.empty() || sqlite3_stricmp(table.name.c_str(), qualifier.c_str()) == 0;
         };
-        for (std::size_t scope = scopes_[name.first];; scope = parents_[scope]) {
+        for (;; scope = parents_[scope]) {
             const auto in_scope = [&](const Table& table) { return table.scope == scope && is_meant(table); };
-            const TableColumn* found = Agreed(column, in_scope);
-            if (found || !status_.Ok()) return found;
+            const Found found = Agreed(column, in_scope);
+            if (found.any || !status_.Ok()) return found;
             if (parents_[scope] == scope) break;
         }
-        return Agreed(column, [](const Table& table) { return !table.is_target; });
+        return Agreed(column, [](const Table& table) { return !table.is_target && table.query == 0; });
     }
 
     // The column of that name in the tables meant, if they agree on its type. Dates are too easily compared wrongly.
     template <class Meant>
-    const TableColumn* Agreed(std::string_view name, Meant is_meant) {
-        const TableColumn* found = nullptr;
-        for (const Table& table : tables_) {
-            const TableColumn* column = is_meant(table) ? FindColumn(table.columns, name) : nullptr;
-            if (!column) continue;
-            if (found && found->column.type != column->column.type) {
-                const bool dates = IsDateType(found->column.type) || IsDateType(column->column.type);
-                if (dates) status_ = Error(errors::kInconsistentTypes, "column " + column->column.name);
-                return nullptr;
-            }
-            found = column;
+    Found Agreed(std::string_view name, Meant is_meant) {
+        Found agreed;
+        for (std::size_t index = 0; index < tables_.size() && status_.Ok(); ++index) {
+            if (!is_meant(tables_[index])) continue;
+            const Found found = ColumnOf(tables_[index], name);
+            if (!found.any) continue;
+            const bool differs = agreed.column && found.column && agreed.column->column.type != found.column->column.type;
+            const bool dates = differs && (IsDateType(agreed.column->column.type) || IsDateType(found.column->column.type));
+            if (dates) status_ = Error(errors::kInconsistentTypes, "column " + PlainName(name));
+            if (differs) return {true, nullptr};
+            agreed = found;
         }
+        return agreed;
+    }
+
+    Found ColumnOf(const Table& table, std::string_view name) {
+        if (table.query == 0) {
+            const TableColumn* column = FindColumn(table.columns, name);
+            return {column != nullptr, column};
+        }
+        constexpr int kDeepest = 30;       // a recursive query looks into itself
+        constexpr int kMostLooks = 1000;   // subqueries that join each other twice and twice again
+        if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(table.query), "select")) return {};
+        ++depth_;
+        const Found found = ColumnOfQuery(table, PlainName(name));
+        --depth_;
         return found;
+    }
+
+    // By the select list of a subquery, and the names that WITH gives to its columns.
+    Found ColumnOfQuery(const Table& table, const std::string& name) {
+        const std::vector<Item> items = Items(table.query);
+        for (std::size_t index = 0; index < items.size(); ++index) {
+            const Item& item = items[index];
+            if (item.is_all && table.names.empty()) {
+                const Found found = FindName(name, item.qualifier, scopes_[table.query]);
+                if (found.any) return found;
+                continue;
+            }
+            const std::string_view called = index < table.names.size() ? table.names[index] : item.name;
+            if (sqlite3_stricmp(PlainName(called).c_str(), name.c_str()) == 0) return {true, TypeOf(item.expression)};
+        }
+        return {};
+    }
+
+    // An expression of a select list, and what it is called.
+    struct Item {
+        Span expression;
+        std::string_view name;
+        bool is_all = false;      // * or t.*
+        std::string qualifier;
+    };
+
+    std::vector<Item> Items(std::size_t select) const {
+        std::vector<Item> items;
+        std::size_t begin = select + 1;
+        if (IsOneOf(At(begin), {"distinct", "all"})) ++begin;
+        for (std::size_t at = begin; at <= pieces_.size(); ++at) {
+            if (At(at) == "(") at = operands_.Partner(at) + 1;
+            const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" ||
+                              IsOneOf(At(at), {"from", "where", "group", "having", "window", "union", "except",
+                                               "intersect", "order", "limit"});
+            if (!ends && At(at) != ",") continue;
+            items.push_back(ReadItem({begin, at}));
+            if (ends) break;
+            begin = at + 1;
+        }
+        return items;
+    }
+
+    Item ReadItem(Span span) const {
+        Item item{span, {}, false, {}};
+        if (span.Size() == 0) return item;
+        const std::string_view last = At(span.last - 1);
+        if (last == "*") {
+            item.is_all = true;
+            if (span.Size() > 2) item.qualifier = PlainName(At(span.last - 3));
+        } else if (span.Size() > 2 && IsWord(At(span.last - 2), "as")) {
+            item.name = last;
+            item.expression.last -= 2;
+        } else if (operands_.From(span.first).last + 1 == span.last && IsName(last)) {
+            item.name = last;
+            --item.expression.last;
+        } else if (operands_.IsColumn(span)) {
+            item.name = last;
+        }
+        return item;
     }
 
     // The scope of each piece: a query, each part of a union for itself; what stands around the query of an insert is
@@ -288,7 +381,9 @@ private:
         for (std::size_t at = 0; at < pieces_.size(); ++at) {
             const bool outside = open.size() == 1;
             if (At(at) == "(") {
-                open.push_back(operands_.IsQuery({at + 1, pieces_.size()}) ? enter(open.back()) : open.back());
+                const bool is_query = operands_.IsQuery({at + 1, pieces_.size()});
+                if (is_query) NoteWith(at);
+                open.push_back(is_query ? enter(open.back()) : open.back());
             } else if (At(at) == ")" && !outside) {
                 open.pop_back();
             } else if (IsOneOf(At(at), {"union", "except", "intersect"})) {
@@ -306,18 +401,53 @@ private:
         }
     }
 
+    // with NAME as (query), with NAME(a, b) as (query): the query opens at `open`.
+    void NoteWith(std::size_t open) {
+        std::size_t at = open;
+        while (at > 0 && IsOneOf(At(at - 1), {"materialized", "not"})) --at;
+        if (at < 2 || !IsWord(At(at - 1), "as")) return;
+        With with;
+        with.query = open + 1;
+        at -= 2;
+        if (At(at) == ")") {
+            const std::size_t names = operands_.Partner(at);
+            for (std::size_t name = names + 1; name < at; name += 2) with.names.push_back(At(name));
+            at = names - 1;
+        }
+        with.name = PlainName(At(at));
+        withs_.push_back(std::move(with));
+    }
+
     void ReadList(std::size_t at, std::size_t scope, bool is_target) {
-        while (At(at) == "(") ++at;
-        while (IsName(At(at)) && !IsKeyword(At(at))) {
+        while (At(at) == "(" && !operands_.IsQuery({at + 1, pieces_.size()})) ++at;
+        for (;;) {
+            const bool is_query = At(at) == "(";
+            if (!is_query && (!IsName(At(at)) || IsKeyword(At(at)))) return;
             Table& table = tables_.emplace_back();
             table.scope = scope;
             table.is_target = is_target;
-            at = ReadTable(database_, pieces_, at, table.columns);
-            table.name = PlainName(At(at - 1));
+            if (is_query) {
+                table.query = at + 1;
+                at = operands_.Partner(at) + 1;
+            } else {
+                at = ReadTable(database_, pieces_, at, table.columns);
+                table.name = PlainName(At(at - 1));
+                UseWith(table);
+            }
             if (IsWord(At(at), "as")) ++at;
             if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
             if (At(at) != ",") return;
             ++at;
+        }
+    }
+
+    // A name that WITH has given hides a table's.
+    void UseWith(Table& table) const {
+        for (const With& with : withs_) {
+            if (sqlite3_stricmp(with.name.c_str(), table.name.c_str()) != 0) continue;
+            table.columns.clear();
+            table.query = with.query;
+            table.names = with.names;
         }
     }
 
@@ -331,6 +461,9 @@ private:
     std::vector<std::size_t> scopes_;     // by piece
     std::vector<std::size_t> parents_;    // by scope; the outermost is its own
     std::deque<Table> tables_;
+    std::vector<With> withs_;
+    int depth_ = 0;                       // of subqueries looked into, and how many for one name
+    int looks_ = 0;
     std::deque<TableColumn> answers_;     // of calls
 };
 

@@ -113,6 +113,17 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"with x as (select id, d from t where d > %) select id from x", "01-JAN-24", "1;"},
         {"with x as (select id, d from t) select id from x where d > %", "01-JAN-24", "1;"},
         {"select id from (select id, d from t) x where x.d > %", "01-JAN-24", "1;"},
+        {"select id from (select id, d as day, to_char(d, 'YYYY') d from t) x where d = '2024' and day > %", "01-JAN-24",
+         "1;"},
+        {"select id from (select t.*, 1 as one from t) where d > % and one = 1", "01-JAN-24", "1;"},
+        {"select id from (select distinct id, trunc(d) day from t) x where x.day = %", "03-FEB-24", "1;"},
+        {"with x(a, b) as (select id, d from t) select a from x where b > %", "01-JAN-24", "1;"},
+        {"with u as (select id, d from t), y as (select u.*, 1 as k from u) select id from y z where z.d > %", "01-JAN-24",
+         "1;"},
+        {"with recursive x(k, y) as (select id, d from t union all select k + 2, y from x where k < 3 and y > %)"
+         " select k from x where k > 2", "01-JAN-24", "3;"},
+        {"select id from (select id, d from t) x where x.d > % and exists (select 1 from u where d = '03-FEB-24')",
+         "01-JAN-24", "1;"},
         {"select id from t where d = % union all select id from u where d = '03-FEB-24'", "03-FEB-24", "1;1;"},
         {"select id from t where d = % and exists (select 1 from u where d = '03-FEB-24')", "03-FEB-24", "1;"},
         {"select t.id from t, u where t.d = % and u.d = '03-FEB-24'", "03-FEB-24", "1;"},
@@ -189,6 +200,19 @@ TEST_F(SqliteMeaning, WhatCannotBeComparedRightlyIsRefused) {
                               "select t.id from t join u on t.id = u.id where t.id = 1",
                               "select id from t where id = 1 group by id having count(*) = 1"})
         EXPECT_EQ(Rows(right), "1;") << right;
+}
+
+// Lists without end, and subqueries that double with each level.
+TEST_F(SqliteMeaning, LongStatementsTakeBoundedTime) {
+    MakeTables();
+    std::string list = "select id from t where d in ('03-FEB-24'";
+    for (int element = 0; element < 20000; ++element) list += ", '03-FEB-24'";
+    EXPECT_EQ(Rows(list + ")"), "1;");
+    std::string doubled = "with x0 as (select d from t)";
+    for (int level = 1; level < 11; ++level)
+        doubled += ", x" + std::to_string(level) + " as (select * from x" + std::to_string(level - 1) + " a, x" +
+                   std::to_string(level - 1) + " b where 1 = 0)";
+    EXPECT_EQ(Rows(doubled + " select count(*) as n from x10 where d = '03-FEB-24'"), "0;");
 }
 
 TEST_F(SqliteMeaning, ExpressionsKeepTheNamesThatTheyWereGiven) {
