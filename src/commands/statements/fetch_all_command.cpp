@@ -184,19 +184,17 @@ void ResultTable::EndValue(ub4 column) {
 // asked for; behind the last column nothing is, unless the library has more.
 bool ResultTable::ReceiveValue(ub4 column) {
     value_.clear();
-    for (;;) {
+    sword rc = OCI_SUCCESS;
+    for (bool goes_on = true; goes_on;) {
         const void* const define = define_;
         if (!ReceivePiece()) return false;
-        if (column == columns_ && fetched_ != OCI_NEED_DATA) {
-            EndValue(column);
-            return true;
-        }
-        const sword rc = AskForPiece();
-        const bool goes_on = define_ == define && (piece_ == OCI_NEXT_PIECE || piece_ == OCI_LAST_PIECE);
-        if (goes_on && !Failed(rc) && length_ > 0) continue;
-        EndValue(column);
-        return Check(rc, Failed(rc));
+        if (column == columns_ && fetched_ != OCI_NEED_DATA) break;
+        rc = AskForPiece();
+        goes_on = define_ == define && (piece_ == OCI_NEXT_PIECE || piece_ == OCI_LAST_PIECE) && length_ > 0 &&
+                  !Failed(rc);
     }
+    EndValue(column);
+    return Check(rc, Failed(rc));
 }
 
 bool ResultTable::PrintRow() {
