@@ -6,8 +6,11 @@
 #include <initializer_list>
 #include <string>
 
+#include "engine/sqlite/column_types.h"
+#include "engine/sqlite/operands.h"
 #include "engine/sqlite/pieces.h"
 #include "engine/sqlite/table_columns.h"
+#include "handles/errors.h"
 
 namespace engine::sqlite {
 namespace {
@@ -19,11 +22,13 @@ public:
     Finder(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces, ValueTargets& targets)
         : database_(database), sql_(sql), pieces_(pieces), targets_(targets) {}
 
-    void Find() {
+    Status Find() {
+        if (Is(0, "create") || Is(0, "alter")) return Definition();
         const bool with = Is(0, "with");
         const std::size_t verb = with ? FindWord(1, {"insert", "replace", "update", "select", "delete"}) : 0;
         if (Is(verb, "insert") || Is(verb, "replace")) Insert(verb);
         else if (Is(verb, "update")) Update(verb);
+        return {};
     }
 
 private:
@@ -50,6 +55,51 @@ private:
             if (found) return index;
         }
         return pieces_.size();
+    }
+
+    // The columns that a table is made with, or one that is added.
+    Status Definition() {
+        const std::size_t table = FindWord(1, {"table", "as"});
+        if (!Is(table, "table")) return {};
+        if (Is(0, "alter")) {
+            std::size_t column = FindWord(table, {"add"}) + 1;
+            if (Is(column, "column")) ++column;
+            return ColumnDefault({column, pieces_.size()});
+        }
+        std::size_t at = table + 1;
+        while (at < pieces_.size() && !Is(at, "(") && !Is(at, "as")) ++at;
+        while (Is(at, "(") || Is(at, ",")) {
+            const std::size_t end = FindWord(at + 1, {","});
+            if (Status status = ColumnDefault({at + 1, end}); !status.Ok()) return status;
+            at = end;
+        }
+        return {};
+    }
+
+    // name type ... default 'literal' ...
+    Status ColumnDefault(Span definition) {
+        const std::size_t type = definition.first + 1;
+        const std::size_t at = FindWord(type, {"default"});
+        std::size_t literal = at + 1;
+        if (at >= definition.last || literal >= definition.last) return {};
+        const bool has_sign = Is(literal, "-") || Is(literal, "+");
+        if (has_sign) ++literal;
+        const bool is_number = literal < definition.last && IsNumber(pieces_[literal]);
+        if (!is_number && !(IsLiteral(pieces_[literal]) && !has_sign)) return {};
+        std::size_t type_end = type;
+        while (type_end < at && (!IsKeyword(pieces_[type_end]) && !Is(type_end, "constraint"))) ++type_end;
+        if (type_end == type) return {};
+        Column column;
+        if (!ReadDeclaredType(sql_.substr(Begin(type), End(type_end - 1) - Begin(type)), column)) return {};
+        if (!Coercion::Concerns(column)) return {};
+        column.name = UpperCase(PlainName(pieces_[definition.first]));
+        if (is_number && IsDateType(column.type)) return Error(errors::kInconsistentTypes, "column " + column.name);
+        const std::string written = is_number ? std::string(sql_.substr(Begin(at + 1), End(literal) - Begin(at + 1)))
+                                              : PlainText(pieces_[literal]);
+        std::string kept;
+        if (Status status = Convert(written, column, Coercion::Purpose::store, kept); !status.Ok()) return status;
+        targets_.edits.push_back({Begin(at + 1), End(literal), std::move(kept), "", true});
+        return {};
     }
 
     void Insert(std::size_t verb) {
@@ -198,9 +248,9 @@ private:
 
 }  // namespace
 
-void FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                     ValueTargets& targets) {
-    Finder(database, sql, pieces, targets).Find();
+Status FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
+                       ValueTargets& targets) {
+    return Finder(database, sql, pieces, targets).Find();
 }
 
 }  // namespace engine::sqlite

@@ -1,5 +1,6 @@
 // Where a statement stores values: insert ... values, insert ... select, update ... set, on conflict do update, also
-// behind `with`. Forms that are not understood are left as they are: triggers are.
+// behind `with`; the defaults of columns that are literals. Forms that are not understood are left as they are: triggers
+// are.
 #pragma once
 
 #include <sqlite3.h>
@@ -8,10 +9,12 @@
 #include <vector>
 
 #include "engine/sqlite/value_targets.h"
+#include "handles/status.h"
 
 namespace engine::sqlite {
 
-void FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                     ValueTargets& targets);
+// Refuses a definition with a default that its column would not take.
+Status FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
+                       ValueTargets& targets);
 
 }  // namespace engine::sqlite

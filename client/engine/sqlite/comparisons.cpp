@@ -14,7 +14,6 @@
 #include "engine/sqlite/operands.h"
 #include "engine/sqlite/pieces.h"
 #include "engine/sqlite/select_list.h"
-#include "engine/sqlite/stored_number.h"
 #include "engine/sqlite/table_columns.h"
 #include "handles/errors.h"
 
@@ -27,35 +26,6 @@ bool IsOneOf(std::string_view piece, std::initializer_list<std::string_view> wor
 
 // What begins another condition, so that the comparison before it is over.
 bool EndsCondition(std::string_view piece) { return piece == "," || piece == ";" || IsKeyword(piece); }
-
-std::string BlobLiteral(std::string_view bytes) {
-    constexpr std::string_view kDigits = "0123456789abcdef";
-    std::string literal = "x'";
-    for (const char c : bytes) {
-        literal += kDigits[static_cast<unsigned char>(c) >> 4];
-        literal += kDigits[static_cast<unsigned char>(c) & 15];
-    }
-    return literal += '\'';
-}
-
-// What has been read from a text, as SQL writes it; empty for what it does not.
-std::string SqlLiteral(const Datum& value) {
-    switch (value.kind) {
-        case Kind::null: return "null";
-        case Kind::integer: return std::to_string(value.integer);
-        case Kind::text:
-        case Kind::timestamp: return Literal(value.Text());
-        case Kind::bytes: return BlobLiteral(value.Text());
-        case Kind::decimal: {
-            const StoredNumber number = StoredNumber::From(*static_cast<const OCINumber*>(value.data));
-            if (number.form == StoredNumber::Form::integer) return std::to_string(number.integer);
-            if (number.form == StoredNumber::Form::blob)
-                return BlobLiteral({reinterpret_cast<const char*>(number.blob), number.length});
-            return {};
-        }
-        default: return {};
-    }
-}
 
 class Finder {
 public:
@@ -217,20 +187,11 @@ private:
 
     // A literal that is no value of the type is refused when the statement runs; in a view, when that is made.
     void UseLiteral(Span span, const TableColumn& column) {
-        const std::string text = PlainText(At(span.first));
-        Datum value;
-        value.kind = Kind::text;
-        value.data = text.data();
-        value.length = static_cast<std::uint32_t>(text.size());
-        Coercion coercion(column.column, Coercion::Purpose::compare);
-        const Status status = coercion.Apply(value);
-        if (status.Failed() && IsWord(At(0), "create")) {
-            status_ = status;
-            return;
-        }
-        const std::string literal = status.Ok() ? SqlLiteral(value) : std::string();
-        if (literal.empty()) return Wrap(span, column);
-        Add(span, literal, "", true);
+        std::string literal;
+        const Status status = Convert(PlainText(At(span.first)), column.column, Coercion::Purpose::compare, literal);
+        if (status.Ok()) Add(span, std::move(literal), "", true);
+        else if (IsWord(At(0), "create")) status_ = status;
+        else Wrap(span, column);
     }
 
     void Wrap(Span span, const TableColumn& column) {

@@ -14,11 +14,6 @@
 namespace engine::sqlite {
 namespace {
 
-std::string UpperCase(std::string text) {
-    for (char& c : text) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return text;
-}
-
 std::vector<TableColumn> ReadColumns(sqlite3* database, const std::string& schema, const std::string& table) {
     std::vector<TableColumn> columns;
     sqlite3_stmt* compiled = nullptr;
@@ -67,6 +62,11 @@ const TableColumn* FindColumn(const std::vector<TableColumn>& columns, std::stri
         return sqlite3_stricmp(column.name.c_str(), plain.c_str()) == 0;
     });
     return found == columns.end() ? nullptr : &*found;
+}
+
+std::string UpperCase(std::string text) {
+    for (char& c : text) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
+    return text;
 }
 
 std::string Literal(std::string_view text) {

@@ -27,6 +27,8 @@ std::size_t ReadTable(sqlite3* database, const std::vector<std::string_view>& pi
 // The column of that name, which may be quoted; null when there is none.
 const TableColumn* FindColumn(const std::vector<TableColumn>& columns, std::string_view name);
 
+std::string UpperCase(std::string text);
+
 // A text as an SQL literal.
 std::string Literal(std::string_view text);
 

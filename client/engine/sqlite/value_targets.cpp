@@ -2,13 +2,41 @@
 #include "engine/sqlite/value_targets.h"
 
 #include <algorithm>
+#include <array>
+#include <charconv>
 
 #include "engine/sqlite/assignments.h"
 #include "engine/sqlite/comparisons.h"
 #include "engine/sqlite/pieces.h"
+#include "engine/sqlite/stored_number.h"
+#include "engine/sqlite/table_columns.h"
+#include "number/number.h"
 
 namespace engine::sqlite {
 namespace {
+
+std::string BlobLiteral(const void* data, std::size_t size) {
+    constexpr std::string_view kDigits = "0123456789abcdef";
+    std::string literal = "x'";
+    for (const char c : std::string_view(static_cast<const char*>(data), size)) {
+        literal += kDigits[static_cast<unsigned char>(c) >> 4];
+        literal += kDigits[static_cast<unsigned char>(c) & 15];
+    }
+    return literal += '\'';
+}
+
+Status NumberLiteral(const OCINumber& number, std::string& literal) {
+    const StoredNumber stored = StoredNumber::From(number);
+    if (stored.form == StoredNumber::Form::blob) {
+        literal = BlobLiteral(stored.blob, stored.length);
+        return {};
+    }
+    std::array<char, number::kMaxPlainText> text;
+    std::size_t length = 0;
+    const int failure = number::ToPlainText(number, '.', text.data(), &length);
+    literal.assign(text.data(), length);
+    return failure == 0 ? Status() : Error(failure);
+}
 
 // Where an edit begins or ends.
 struct Mark {
@@ -45,10 +73,33 @@ std::string ValueTargets::Rewritten(std::string_view text) const {
     return rewritten.append(text.substr(copied));
 }
 
+Status Convert(std::string_view text, const Column& column, Coercion::Purpose purpose, std::string& literal) {
+    Datum value;
+    value.kind = Kind::text;
+    value.data = text.data();
+    value.length = static_cast<std::uint32_t>(text.size());
+    Coercion coercion(column, purpose);
+    if (Status status = coercion.Apply(value); status.Failed()) return status;
+    switch (value.kind) {
+        case Kind::null: literal = "null"; break;
+        case Kind::decimal: return NumberLiteral(*static_cast<const OCINumber*>(value.data), literal);
+        case Kind::bytes: literal = BlobLiteral(value.data, value.length); break;
+        case Kind::real: {
+            std::array<char, 40> digits;
+            const char* end = std::to_chars(digits.data(), digits.data() + digits.size(), value.real).ptr;
+            literal.assign(digits.data(), static_cast<std::size_t>(end - digits.data()));
+            if (literal.find_first_of(".e") == std::string::npos) literal += ".0";
+            break;
+        }
+        default: literal = Literal(value.Text()); break;
+    }
+    return {};
+}
+
 Status FindValueTargets(sqlite3* database, std::string_view sql, ValueTargets& targets) {
     const std::vector<std::string_view> pieces = Split(sql);
-    FindAssignments(database, sql, pieces, targets);
-    return FindComparisons(database, sql, pieces, targets);
+    Status status = FindAssignments(database, sql, pieces, targets);
+    return status.Ok() ? FindComparisons(database, sql, pieces, targets) : status;
 }
 
 }  // namespace engine::sqlite

@@ -45,6 +45,9 @@ struct ValueTargets {
     [[nodiscard]] std::string Rewritten(std::string_view text) const;
 };
 
+// Reads a text as a value of the column and writes it as an SQL literal, as SQLite keeps the value.
+Status Convert(std::string_view text, const Column& column, Coercion::Purpose purpose, std::string& literal);
+
 // Looks through a statement that SQLite has found to be well-formed. Refuses what compares values in a way whose
 // meaning cannot be told: 932, 933.
 Status FindValueTargets(sqlite3* database, std::string_view sql, ValueTargets& targets);

@@ -435,6 +435,27 @@ TEST_F(SqliteMeaning, DefaultsAreExpressions) {
     MustRun("alter table t add h number default 3");
     EXPECT_EQ(Rows("select h from t"), "3;");
     EXPECT_EQ(Run("create table u(a varchar2(9) default nobody)"), 900) << "no text without quotes";
+
+    const struct { const char* column; const char* kept; } cases[] = {
+        {"date default '09-FEB-24'", "2024-02-09 00:00:00"}, {"date not null default '09-FEB-24' unique", "2024-02-09 00:00:00"},
+        {"timestamp(1) default '2024-02-09 00:00:00.25'", "2024-02-09 00:00:00.3"}, {"char(3) default 'ab   '", "ab"},
+        {"number(5,2) default 1.005", "1.01"}, {"number(5,2) default '-1.005'", "-1.01"}, {"number default -7", "-7"},
+        {"binary_float default 16777217", "16777216.0"}, {"varchar2(2) default 'it''s'", "!12899"},
+        {"varchar2(4) default 'it''s'", "it's"}, {"date default 'today'", "!1858"}, {"date default 5", "!932"},
+        {"number(3) default 1000", "!1438"}, {"raw(2) default '0aFF' check (length(a) > 0)", "\x0a\xff"},
+        {"date default null", "-"}};
+    for (const auto& c : cases) {
+        const std::string column = c.column;
+        const sb4 error = Run("create table u(id number, a " + column + ", z number(1) default 2)");
+        if (error == 0) MustRun("insert into u(id) values(1)");
+        const std::string kept = error != 0 ? "!" + std::to_string(error) : Rows("select cast(a as text) as a from u");
+        EXPECT_EQ(kept, c.kept[0] == '!' ? c.kept : c.kept + std::string(";")) << column;
+        if (error == 0) MustRun("drop table u");
+    }
+    MustRun("create table u(id number)");
+    MustRun("alter table u add column d date default '09-FEB-24'");
+    MustRun("insert into u(id) values(1)");
+    EXPECT_EQ(Rows("select d || '' as d from u"), "2024-02-09 00:00:00;");
 }
 
 TEST_F(SqliteMeaning, OnlyStatementsOfApplicationsReachTheEngine) {
