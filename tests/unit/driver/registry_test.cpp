@@ -171,7 +171,7 @@ TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
     }
     Release(Kind::lob, "arr");
     EXPECT_EQ(Register(Kind::lob, "after", &object_a, nullptr), &*SlotsOf(Kind::lob).begin());
-    EXPECT_EQ(ResolveObject(Kind::lob, "after[0]"), &object_a) << "the slot of an array was taken by a single descriptor";
+    EXPECT_EQ(ResolveObject(Kind::lob, "after[0]"), &object_a) << "a single descriptor in the slot of an array";
     Release(Kind::lob, "after");
     EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "arr2[1]"); }), "Handle arr2 not found\n");
     EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "null[1]"); }), "");
