@@ -1,29 +1,35 @@
-// Datum: one value on its way between an engine and the application, as a view. A Datum owns nothing; `data` is
-// borrowed and valid as long as the call that filled it says.
+// Datum: one value on its way between an engine and the application, as a view. A Datum owns nothing; what `data`
+// points to is borrowed and valid as long as the call that filled it says.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 #include <string_view>
 
+#include "date/date.h"
+#include "engine/row_id.h"
+
+struct OCINumber;
+
 namespace engine {
 
 enum class Kind : std::uint8_t {
-    null,       // no value
+    null,       // no value; of a placeholder's kind: not known yet
     integer,    // 64-bit signed, in `integer`
-    real,       // IEEE double, in `real`
-    decimal,    // a decimal number: the 22 bytes of an OCINumber at `data`
-    text,       // UTF-8, `length` bytes at `data`; a decimal, date or timestamp column of an engine may arrive so
+    real,       // IEEE double, in `real`; single-precision values arrive so, too
+    decimal,    // a decimal number: an OCINumber at `data`
+    text,       // UTF-8, `length` bytes at `data`; also what lies in a typed column without being of its type
     bytes,      // `length` bytes at `data`
-    timestamp,  // date and time in the engine's text form: "YYYY-MM-DD HH:MM:SS[.fffffffff][ +hh:mm]", at `data`
-    lob,        // a large object: `integer` is the engine's number of it
-    row_id,     // `integer` is the engine's row number, `length` the table's number in the session
-    cursor      // a result set: `integer` is an index into the query's cursors
+    timestamp,  // date, time, fraction, zone: a date::DateTime at `data`; dates arrive so, too
+    lob,        // a large object: its locator, `length` bytes at `data` (lobs.h)
+    row_id,     // a RowId at `data`
+    cursor      // a result set: what Connection::OpenCursor takes, `length` bytes at `data`
 };
+constexpr std::size_t kKinds = static_cast<std::size_t>(Kind::cursor) + 1;
 
 struct Datum {
     Kind kind = Kind::null;
-    std::uint32_t length = 0;
+    std::uint32_t length = 0;    // bytes at `data`; 0 for integers and reals
     union {
         std::int64_t integer = 0;
         double real;
@@ -31,6 +37,9 @@ struct Datum {
     };
 
     [[nodiscard]] std::string_view Text() const { return {static_cast<const char*>(data), length}; }
+    [[nodiscard]] const OCINumber& Number() const { return *static_cast<const OCINumber*>(data); }
+    [[nodiscard]] const date::DateTime& Timestamp() const { return *static_cast<const date::DateTime*>(data); }
+    [[nodiscard]] const RowId& Row() const { return *static_cast<const RowId*>(data); }
 };
 
 }  // namespace engine
