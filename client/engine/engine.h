@@ -10,8 +10,9 @@
 //
 // Transactions: a statement says what it does (Effect), the engine sees to the rest: it begins a transaction before the
 // first statement that changes or locks something, and commits before and after one that defines. A statement that
-// fails undoes itself and not the transaction. Between statements an idle connection holds no transaction open but one
-// that the session has work in.
+// fails undoes itself and not the transaction; where the engine lost the transaction with it, InTransaction tells.
+// Between statements an idle connection holds no transaction open but one that the session has work in: one that a
+// statement began and did nothing in, because it failed, is ended.
 #pragma once
 
 #include <atomic>
@@ -121,8 +122,9 @@ public:
     virtual const std::vector<Column>& Columns() = 0;
 
     // Runs a statement that changes something once for each row of the run. Stops at the first failure (rows before it
-    // stay done), unless all rows are tried; failures are in `outcome`. A Status that is an error means that nothing is
-    // done: nothing could be run, or the transaction is gone.
+    // stay done), unless all rows are tried. What it did is added to `outcome`, failures with it: memory that is short
+    // is the failure of a row (1019). A Status that is an error means that nothing is done: nothing could be run, or
+    // the transaction is gone.
     virtual Status ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) = 0;
 
     // Starts a query; one that is open is closed first. The values are taken over, the source may go afterwards.
@@ -133,7 +135,9 @@ public:
     virtual Status Open(RowSource& source, const QueryRun& run) = 0;
     [[nodiscard]] virtual bool IsOpen() const = 0;
     // Delivers up to `most` rows. `more` is false once the end is reached; a query that cannot be scrolled is closed
-    // then. After a failure of the sink the next call goes on behind the row that it refused.
+    // then. After a failure of the sink the next call goes on behind the row that it refused, and after bad_alloc with
+    // the first one that the sink did not get; any other failure closes the query. 1002 when none is open, here and in
+    // Scroll and Count.
     virtual Status Fetch(RowSink& sink, std::uint32_t most, bool& more) = 0;
     // Delivers the row at `position` of a scrollable query, from 1, and stands there: the next Fetch goes on behind it.
     // `found` is false for 0 and beyond the last row; the query stands before the first or behind the last one then.
@@ -160,7 +164,8 @@ struct ObjectDescription {
 
 // ---- Connections
 
-// The wish to stop what runs. It is kept above the engines, since it holds for the next call when none runs.
+// The wish to stop what runs. It is kept above the engines, since it holds for the next call when none runs: one that
+// stands when ExecuteArray, Open, Fetch, Scroll or Count begins stops that call. Whoever is told 1013 takes it back.
 class StopRequest {
 public:
     void Ask() noexcept { asked_.store(true, std::memory_order_relaxed); }
@@ -183,7 +188,8 @@ class Connection {
 public:
     virtual ~Connection() = default;    // rolls back what is open
 
-    // Takes effect at once and for good. An engine that could do so only within the open transaction refuses.
+    // Takes effect at once and for good. An engine that could do so only within the open transaction refuses (24754).
+    // 28008 when the old password is wrong, 1017 when there is no such user or the new password cannot be one.
     virtual Status ChangePassword(const std::string& user, const std::string& old_password,
                                   const std::string& new_password) = 0;
 
@@ -192,9 +198,11 @@ public:
     virtual Status Compile(const StatementSource& source, std::unique_ptr<Query>& query,
                            std::uint32_t& error_offset) = 0;
     // A query over the rows of a fetched result set (Kind::cursor), open.
-    virtual Status OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) = 0;
+    virtual Status OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) = 0;    // 932 for anything else
 
-    virtual Status Begin(TransactionMode mode) = 0;    // does nothing within a transaction
+    // Does nothing within a transaction. A read-only or serializable one sees what was there when it began; a change
+    // within a read-only one is refused (1456).
+    virtual Status Begin(TransactionMode mode) = 0;
     // Does nothing outside a transaction. A commit that fails has rolled back (2091, or the engine's own number) unless
     // InTransaction still holds.
     virtual Status Commit() = 0;
@@ -203,26 +211,30 @@ public:
 
     // Marks in the transaction, which nest: UndoToMark undoes what was done since the last one, which stays; DropMark
     // forgets the last one and keeps the work. SetMark begins a transaction when there is none. The end of the
-    // transaction forgets them all.
+    // transaction forgets them all. 1086 without a mark. Any other failure of UndoToMark has rolled all of the
+    // transaction back.
     virtual Status SetMark() = 0;
     virtual Status UndoToMark() = 0;
     virtual Status DropMark() = 0;
 
     // Two-phase commit, of engines that can. Prepare ends the connection's part in the transaction: afterwards it is
     // outside of one, and any connection of the database finishes the branch by its name, which lasts as long as
-    // Capabilities tells. A branch that changed nothing is committed instead, and `read_only` says so.
+    // Capabilities tells. A branch that changed nothing is committed instead, and `read_only` says so. 1022 of engines
+    // that cannot.
     virtual Status Prepare(const Xid& xid, bool& read_only) = 0;
     virtual Status CommitPrepared(const Xid& xid) = 0;      // 24756 when there is none of that name
     virtual Status RollbackPrepared(const Xid& xid) = 0;
     virtual Status Recover(std::vector<Xid>& prepared) = 0;
 
     // A further connection of the same user, who need not prove himself again. A branch that is set aside keeps its own
-    // connection, with the transaction open, for whoever takes the branch up; its session goes on with another.
+    // connection, with the transaction open, for whoever takes the branch up; its session goes on with another. 1022
+    // where the database has room for one connection.
     virtual Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) = 0;
     // From now on this is the wish that the connection's calls look at: that of the session that it serves.
     virtual void Obey(std::shared_ptr<const StopRequest> stop) noexcept = 0;
 
-    // 4043 when there is none of that name and kind, 942 where a table or view is wanted.
+    // A name is a word or a quoted one, perhaps with its schema's and a point before it. 4043 when there is none of
+    // that name and kind, 942 where a table or view is wanted.
     virtual Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) = 0;
     virtual LobStore* Lobs() = 0;    // null where Capabilities has no lobs
 
@@ -234,8 +246,8 @@ public:
     [[nodiscard]] bool HasNotices() const noexcept { return !notices_.empty(); }
 
     // Has the call that runs look at the StopRequest: it then answers 1013 as soon as it can, and leaves the request as
-    // it is. Calls that only end or undo (Commit, Rollback, UndoToMark, DropMark, Prepare and its kin, Close) do not look
-    // at it. From any thread; does nothing when no call runs.
+    // it is. Calls that only end or undo (Commit, Rollback, UndoToMark, DropMark, Prepare and its kin, Close) do not
+    // look at it. From any thread; does nothing when no call runs.
     virtual void Interrupt() noexcept = 0;
 
 protected:
