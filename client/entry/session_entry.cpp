@@ -99,7 +99,7 @@ Status BeginSession(ServiceContext& service, Session& session, ub4 kind, ub4 mod
     return status;
 }
 
-// Changes the password on a connection of its own, which the session then goes on with.
+// Begins a session with the old password, changes it, and takes the session into the context.
 Status ChangePasswordAndLogOn(ServiceContext& service, const std::string& user, const std::string& old_password,
                               const std::string& new_password) {
     Server* server = nullptr;
@@ -108,17 +108,15 @@ Status ChangePasswordAndLogOn(ServiceContext& service, const std::string& user, 
     Session* set = service.GetSession();
     Session& session = set ? *set : service.OwnSession();
     if (session.Begun()) return session.GetLink()->Engine().ChangePassword(user, old_password, new_password);
-    std::unique_ptr<engine::Connection> connection;
-    status = server->TakeConnection(connection);
-    if (status.Ok()) status = connection->Authenticate({user, old_password, false});
-    if (status.Ok()) status = connection->ChangePassword(user, old_password, new_password);
+    status = session.Begin(*server, {user, old_password, false});
+    if (status.Failed()) return status;
+    status = session.GetLink()->Engine().ChangePassword(user, old_password, new_password);
     if (status.Failed()) {
-        if (connection) server->GiveBack(std::move(connection));
+        session.Drop();
         return status;
     }
     session.user = user;
-    status = session.Adopt(*server, std::move(connection), user);
-    return status.Ok() ? service.SetSession(&session) : status;
+    return service.SetSession(&session);
 }
 
 struct PasswordTexts {
@@ -148,8 +146,9 @@ Status VersionText(Object& object, std::string& text) {
         Status status = service->RequireServer(server);
         if (status.Failed()) return status;
     }
-    if (!server->Attached()) return Error(errors::kNotConnected);
-    text = server->Version();
+    const std::shared_ptr<engine::Database> database = server->AttachedDatabase();
+    if (!database) return Error(errors::kNotConnected);
+    text = database->Version();
     return {};
 }
 

@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "handles/errors.h"
 #include "handles/object.h"
 
 std::shared_ptr<Link> LinkShare::Share() const {
@@ -28,8 +29,12 @@ void LinkUser::Use(std::shared_ptr<Link> link) noexcept {
     if (UsedLink()) UsedLink()->Add(*this);
 }
 
-Link::Link(std::unique_ptr<engine::Connection> connection, bool threaded)
-    : connection_(std::move(connection)), serial_(threaded ? std::make_shared<std::recursive_mutex>() : nullptr) {}
+Link::Link(std::shared_ptr<engine::Database> database, std::unique_ptr<engine::Connection> connection,
+           std::shared_ptr<engine::StopRequest> stop, bool threaded)
+    : database_(std::move(database)),
+      stop_(std::move(stop)),
+      connection_(std::move(connection)),
+      serial_(threaded ? std::make_shared<std::recursive_mutex>() : nullptr) {}
 
 Link::~Link() { Close(); }
 
@@ -55,21 +60,22 @@ LinkUser* Link::AnyUser() noexcept {
 
 void Link::Cancel() noexcept {
     const std::lock_guard lock(cancel_mutex_);
-    if (connection_) connection_->Cancel();
+    stop_->Ask();
+    if (connection_) connection_->Interrupt();
 }
 
-void Link::ForgetCancel() noexcept {
-    const std::lock_guard lock(cancel_mutex_);
-    if (connection_) connection_->ForgetCancel();
+void Link::Answered(const Status& status) noexcept {
+    if (status.Number() == errors::kCancelled) (void)stop_->Take();
 }
 
-std::unique_ptr<engine::Connection> Link::Close() noexcept {
+void Link::Close() noexcept {
     const SerialLock serial(serial_);    // calls on statements of the link may be running
     while (LinkUser* user = AnyUser()) {
         user->LinkClosed();
         user->Use(nullptr);
     }
     statement_cache.reset();
+    std::unique_ptr<engine::Connection> ended;    // rolls back when it goes, after the lock
     const std::lock_guard lock(cancel_mutex_);
-    return std::move(connection_);
+    ended = std::move(connection_);
 }

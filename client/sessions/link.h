@@ -1,5 +1,6 @@
-// A link: one user session's connection to its engine. Service contexts and statements share it; when the session ends
-// the link closes, everything made from the connection is dropped first, and who still holds the link finds it closed.
+// A link: one user session's connection to its engine, and the wish to stop what runs on it. Service contexts and
+// statements share it; when the session ends the link closes, everything made from the connection is dropped first, and
+// who still holds the link finds it closed.
 #pragma once
 
 #include <cstdint>
@@ -56,22 +57,27 @@ struct LinkData {
 
 class Link {
 public:
-    // `threaded`: calls on the link are serialised.
-    Link(std::unique_ptr<engine::Connection> connection, bool threaded);
+    // `threaded`: calls on the link are serialised. The connection heeds `stop`.
+    Link(std::shared_ptr<engine::Database> database, std::unique_ptr<engine::Connection> connection,
+         std::shared_ptr<engine::StopRequest> stop, bool threaded);
     ~Link();
     Link(const Link&) = delete;
     Link& operator=(const Link&) = delete;
 
     [[nodiscard]] bool Closed() const { return !connection_; }
     [[nodiscard]] engine::Connection& Engine() { return *connection_; }    // not when closed
+    [[nodiscard]] engine::Database& Database() { return *database_; }
     [[nodiscard]] const std::shared_ptr<std::recursive_mutex>& Serial() const { return serial_; }
 
-    // Stops the call that runs on the connection, or the next one; forgets a stop that met none. From any thread.
+    // Stops the call that runs on the connection, or the next one that executes or fetches; forgets a stop that met
+    // none. From any thread.
     void Cancel() noexcept;
-    void ForgetCancel() noexcept;
+    void ForgetCancel() noexcept { (void)stop_->Take(); }
+    // To be told what an execute or a fetch answered: one that was stopped (1013) has met the wish, which is forgotten.
+    void Answered(const Status& status) noexcept;
 
-    // Drops what depends on the connection and gives the connection up; null when closed before.
-    std::unique_ptr<engine::Connection> Close() noexcept;
+    // Drops what depends on the connection, and the connection: what is open is rolled back.
+    void Close() noexcept;
 
     std::unique_ptr<LinkData> statement_cache;
     std::string user;                    // who is logged on; empty: the operating-system user
@@ -83,6 +89,8 @@ private:
     void Remove(LinkUser& user) noexcept;
     LinkUser* AnyUser() noexcept;
 
+    const std::shared_ptr<engine::Database> database_;
+    const std::shared_ptr<engine::StopRequest> stop_;
     std::unique_ptr<engine::Connection> connection_;
     std::shared_ptr<std::recursive_mutex> serial_;
     std::mutex cancel_mutex_;    // between Cancel and the end of the connection

@@ -1,4 +1,4 @@
-// Server handles: attaching, detaching, connections for sessions.
+// Server handles: attaching and detaching.
 #include "sessions/server.h"
 
 #include <algorithm>
@@ -39,7 +39,7 @@ Status GetInCurrentMode(Server&, AttributeValue& value) {
 }
 
 Status GetDatabase(Server& server, AttributeValue& value) {
-    value.text = server.Database();
+    value.text = server.DatabaseName();
     return {};
 }
 
@@ -61,9 +61,11 @@ Server::~Server() { DropSessions(); }
 
 std::span<const AttributeRow> Server::Attributes() const { return kRows; }
 
-bool Server::Attached() const {
+bool Server::Attached() const { return AttachedDatabase() != nullptr; }
+
+std::shared_ptr<engine::Database> Server::AttachedDatabase() const {
     const std::lock_guard lock(mutex_);
-    return attached_;
+    return database_;
 }
 
 void Server::Join(Session& session, const std::shared_ptr<Link>& link) {
@@ -85,26 +87,26 @@ std::vector<std::shared_ptr<Link>> Server::Links() const {
 
 Status Server::Attach(std::string_view database) {
     if (Attached()) return Error(errors::kAlreadyAttached);
-    std::unique_ptr<engine::Connection> connection;
-    Status status = engine::Connect(database, connection);
+    std::unique_ptr<engine::Database> opened;
+    Status status = engine::Open(database, opened);
     if (status.Failed()) return status;
+    std::string name(database);
+    std::shared_ptr<engine::Database> shared = std::move(opened);
     const std::lock_guard lock(mutex_);
-    if (attached_) return Error(errors::kAlreadyAttached);
-    database_ = database;
-    version_ = connection->ServerVersion();
-    spare_ = std::move(connection);
-    attached_ = true;
+    if (database_) return Error(errors::kAlreadyAttached);
+    name_ = std::move(name);
+    database_ = std::move(shared);
     return status;
 }
 
 Status Server::Detach() {
     if (!Attached()) return Error(errors::kNotConnected);
     DropSessions();
-    std::unique_ptr<engine::Connection> spare;    // closed when the lock is given up
+    std::shared_ptr<engine::Database> detached;    // goes when the lock is given up
     const std::lock_guard lock(mutex_);
-    spare = std::move(spare_);
-    attached_ = false;
-    database_.clear();
+    detached = std::move(database_);
+    database_.reset();
+    name_.clear();
     return {};
 }
 
@@ -124,20 +126,4 @@ void Server::DropSessions() noexcept {
         const SerialLock serial(begun.link->Serial());
         if (Joined(*begun.session)) begun.session->Drop();    // else it is freed, or ended
     }
-}
-
-Status Server::TakeConnection(std::unique_ptr<engine::Connection>& connection) {
-    std::string database;
-    {
-        const std::lock_guard lock(mutex_);
-        if (!attached_) return Error(errors::kNotConnected);
-        connection = std::move(spare_);
-        database = database_;
-    }
-    return connection ? Status() : engine::Connect(database, connection);
-}
-
-void Server::GiveBack(std::unique_ptr<engine::Connection> connection) noexcept {
-    const std::lock_guard lock(mutex_);
-    if (attached_ && !spare_) spare_ = std::move(connection);
 }

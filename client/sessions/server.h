@@ -25,15 +25,13 @@ public:
     [[nodiscard]] bool InUse() const override { return own_ || LastBegun().session; }
 
     [[nodiscard]] bool Attached() const;
-    [[nodiscard]] const std::string& Database() const { return database_; }    // change with attaching alone
-    [[nodiscard]] const std::string& Version() const { return version_; }
+    [[nodiscard]] const std::string& DatabaseName() const { return name_; }    // changes with attaching alone
 
     Status Attach(std::string_view database);
     Status Detach();    // sessions that are still begun are dropped: what they did not commit is rolled back
 
-    // A connection for a session: the one that attaching opened, or a further one.
-    Status TakeConnection(std::unique_ptr<engine::Connection>& connection);
-    void GiveBack(std::unique_ptr<engine::Connection> connection) noexcept;
+    // What is attached; null when nothing is.
+    [[nodiscard]] std::shared_ptr<engine::Database> AttachedDatabase() const;
 
     // Sessions that are begun and not ended, and their links.
     void Join(Session& session, const std::shared_ptr<Link>& link);
@@ -58,9 +56,7 @@ private:
 
     const bool own_;    // made by a logon and below its service context
     mutable std::mutex mutex_;    // of what follows; nothing else is locked or called while it is held
-    bool attached_ = false;
-    std::string database_;
-    std::string version_;
-    std::unique_ptr<engine::Connection> spare_;
+    std::shared_ptr<engine::Database> database_;    // null when detached
+    std::string name_;
     std::vector<BegunSession> sessions_;
 };

@@ -47,20 +47,15 @@ std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_.Serial();
 
 Status Session::Begin(Server& server, const engine::Credentials& credentials) {
     if (Begun()) return Error(errors::kAlreadyAuthenticated);
+    std::shared_ptr<engine::Database> database = server.AttachedDatabase();
+    if (!database) return Error(errors::kNotConnected);
+    auto stop = std::make_shared<engine::StopRequest>();
     std::unique_ptr<engine::Connection> connection;
-    Status status = server.TakeConnection(connection);
+    Status status = database->Connect(credentials, stop, connection);
     if (status.Failed()) return status;
-    status = connection->Authenticate(credentials);
-    if (status.Failed()) {
-        server.GiveBack(std::move(connection));
-        return status;
-    }
-    return Adopt(server, std::move(connection), credentials.external ? std::string() : credentials.user);
-}
-
-Status Session::Adopt(Server& server, std::unique_ptr<engine::Connection> connection, std::string user_name) {
-    auto link = std::make_shared<Link>(std::move(connection), Env().Threaded());
-    link->user = std::move(user_name);
+    auto link =
+        std::make_shared<Link>(std::move(database), std::move(connection), std::move(stop), Env().Threaded());
+    if (!credentials.external) link->user = credentials.user;
     const SerialLock serial(link->Serial());
     server.Join(*this, link);
     server_ = &server;
@@ -80,10 +75,8 @@ void Session::Drop() noexcept {
     const SerialLock serial(link_.Serial());
     const std::shared_ptr<Link> link = link_.Get();
     if (!link) return;
-    std::unique_ptr<engine::Connection> connection = link->Close();
+    link->Close();
     Server* server = std::exchange(server_, nullptr);
     server->Leave(*this);
     link_.Set(nullptr);    // last: who frees the session waits for the lock as long as it has a link
-    if (connection->InTransaction() && connection->Rollback().Failed()) return;    // no use to anybody
-    server->GiveBack(std::move(connection));
 }

@@ -27,8 +27,6 @@ public:
     [[nodiscard]] std::shared_ptr<Link> ShareLink() const { return link_.Share(); }    // without the serial lock
 
     Status Begin(Server& server, const engine::Credentials& credentials);
-    // Begins with a connection on which the user has proved who he is.
-    Status Adopt(Server& server, std::unique_ptr<engine::Connection> connection, std::string user_name);
     Status End();             // commits; an error leaves the session as it was
     void Drop() noexcept;     // rolls back; nothing when not begun
 
