@@ -39,11 +39,11 @@ std::string FileOf(std::string_view database) {
 
 }  // namespace
 
-Status Connect(std::string_view database, std::unique_ptr<Connection>& connection) {
-    if (database.empty()) database = kDefaultName;
-    const bool is_remote = IsUrl(database) || !UrlOf(database).empty();
+Status Open(std::string_view name, std::unique_ptr<Database>& database) {
+    if (name.empty()) name = kDefaultName;
+    const bool is_remote = IsUrl(name) || !UrlOf(name).empty();
     if (is_remote) return Error(errors::kNoDriver, "no PostgreSQL engine in this build");
-    return sqlite::Connect(FileOf(database), connection);
+    return sqlite::Open(FileOf(name), database);
 }
 
 }  // namespace engine

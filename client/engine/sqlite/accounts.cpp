@@ -19,7 +19,7 @@ namespace {
 constexpr const char* kHashMethod = "$y$";    // yescrypt
 
 constexpr const char* kCreate =
-    "create table if not exists kelp_accounts(name text primary key, password text not null, "
+    "create table if not exists main.kelp_accounts(name text primary key, password text not null, "
     "created text not null default current_timestamp)";
 
 // User names are the same in either letter case.
@@ -50,9 +50,11 @@ bool Matches(const std::string& password, const std::string& hash) {
     return Usable(password) && Hash(password, hash.c_str()) == hash;
 }
 
-// Runs a statement with up to two texts bound; `answer` takes the first column of the first row, if there is one.
+// Runs a statement with texts bound; `answer` takes the first column of the first row, if there is one. The table is
+// the database's own: a temporary one of that name would come before it.
 Status Run(SqliteConnection& connection, const char* sql, std::initializer_list<std::string_view> texts,
            std::string* answer, bool* found) {
+    const SqliteConnection::Trusted trusted(connection);
     sqlite3* database = connection.Database();
     sqlite3_stmt* compiled = nullptr;
     int code = sqlite3_prepare_v2(database, sql, -1, &compiled, nullptr);
@@ -60,43 +62,50 @@ Status Run(SqliteConnection& connection, const char* sql, std::initializer_list<
     if (code != SQLITE_OK) return Failure(database, code);
     int index = 0;
     for (const std::string_view text : texts) {
-        sqlite3_bind_text(compiled, ++index, text.data(), static_cast<int>(text.size()), SQLITE_TRANSIENT);
+        code = sqlite3_bind_text(compiled, ++index, text.data(), static_cast<int>(text.size()), SQLITE_TRANSIENT);
+        if (code != SQLITE_OK) return Failure(database, code);
     }
     code = sqlite3_step(compiled);
+    if (code != SQLITE_ROW && code != SQLITE_DONE) return connection.Failed(code, Verb::other, false);
     if (found) *found = code == SQLITE_ROW;
-    if (code == SQLITE_ROW && answer) *answer = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
-    return code == SQLITE_ROW || code == SQLITE_DONE ? Status() : Failure(database, code);
+    const auto* text = code == SQLITE_ROW ? sqlite3_column_text(compiled, 0) : nullptr;
+    if (answer && text) *answer = reinterpret_cast<const char*>(text);
+    return {};
 }
 
 Status HasAccounts(SqliteConnection& connection, bool& has) {
-    Status status = Run(connection, "select name from sqlite_schema where name = 'kelp_accounts'", {}, nullptr, &has);
-    return status.Ok() && has ? Run(connection, "select name from kelp_accounts limit 1", {}, nullptr, &has) : status;
+    Status status =
+        Run(connection, "select name from main.sqlite_schema where name = 'kelp_accounts'", {}, nullptr, &has);
+    return status.Ok() && has ? Run(connection, "select name from main.kelp_accounts limit 1", {}, nullptr, &has)
+                              : status;
 }
 
 Status FindHash(SqliteConnection& connection, const std::string& user, std::string& hash, bool& found) {
-    return Run(connection, "select password from kelp_accounts where name = ?1", {Folded(user)}, &hash, &found);
+    return Run(connection, "select password from main.kelp_accounts where name = ?1", {Folded(user)}, &hash, &found);
 }
 
 bool OwnsFile(SqliteConnection& connection) {
     struct stat file{};
-    return !connection.Private() && stat(sqlite3_db_filename(connection.Database(), "main"), &file) == 0 &&
+    return !connection.Private() && stat(connection.File().c_str(), &file) == 0 &&
            file.st_uid == geteuid();
 }
 
 // Two first logons at a time: the transaction lets one be the owner, the other is then checked like any.
 Status TakeOwnership(SqliteConnection& connection, const Credentials& credentials, bool& taken) {
-    Status status = connection.Begin();
+    Status status = connection.Begin(TransactionMode::read_write);
     bool has_accounts = false;
     if (status.Ok()) status = Run(connection, kCreate, {}, nullptr, nullptr);
     if (status.Ok()) status = HasAccounts(connection, has_accounts);
     if (status.Ok() && !has_accounts) {
         const std::string hash = NewHash(credentials.password);
         status = hash.empty() ? Error(errors::kInternalError, "password cannot be hashed")
-                              : Run(connection, "insert into kelp_accounts(name, password) values(?1, ?2)",
+                              : Run(connection, "insert into main.kelp_accounts(name, password) values(?1, ?2)",
                                     {Folded(credentials.user), hash}, nullptr, nullptr);
         taken = status.Ok();
     }
-    if (status.Ok()) return connection.Commit();
+    if (status.Ok()) status = connection.Commit();
+    if (status.Ok()) return status;
+    taken = false;
     (void)connection.Rollback();    // the first error counts
     return status;
 }
@@ -123,6 +132,7 @@ Status Authenticate(SqliteConnection& connection, const Credentials& credentials
 
 Status ChangePassword(SqliteConnection& connection, const std::string& user, const std::string& old_password,
                       const std::string& new_password) {
+    if (connection.InTransaction()) return Error(errors::kTransactionActive);    // a rollback would undo the change
     bool found = false;
     Status status = HasAccounts(connection, found);
     std::string hash;
@@ -133,8 +143,8 @@ Status ChangePassword(SqliteConnection& connection, const std::string& user, con
     const std::string new_hash = Usable(new_password) ? NewHash(new_password) : std::string();
     if (new_hash.empty()) return Error(errors::kBadLogon);
     connection.ReadAhead(nullptr);
-    return Run(connection, "update kelp_accounts set password = ?2 where name = ?1", {Folded(user), new_hash}, nullptr,
-               nullptr);
+    return Run(connection, "update main.kelp_accounts set password = ?2 where name = ?1", {Folded(user), new_hash},
+               nullptr, nullptr);
 }
 
 }  // namespace engine::sqlite

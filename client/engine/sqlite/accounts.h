@@ -10,6 +10,9 @@ namespace engine::sqlite {
 
 class SqliteConnection;
 
+inline constexpr const char* kAccounts = "kelp_accounts";    // the table
+inline constexpr const char* kPasswords = "password";        // its column of hashes
+
 Status Authenticate(SqliteConnection& connection, const Credentials& credentials);
 Status ChangePassword(SqliteConnection& connection, const std::string& user, const std::string& old_password,
                       const std::string& new_password);

@@ -80,17 +80,6 @@ int HexDigit(char c) {
     return -1;
 }
 
-// Whether a text in the engine's form has more than `digits` of a fraction.
-bool HasMoreDigits(std::string_view text, int digits) {
-    const std::size_t point = text.find('.');
-    if (point == std::string_view::npos) return false;
-    const std::size_t end = std::min(text.find_first_not_of("0123456789", point + 1), text.size());
-    return end - point - 1 > static_cast<std::size_t>(digits);
-}
-
-// Of texts in the engine's form: no year is written with two digits.
-bool IsTimeAlone(std::string_view text) { return text.size() > 2 && text[2] == ':'; }
-
 // The default model of the type, else the form in which dates are kept.
 int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
     if (date::FromEngineText(text, &value) == 0 && value.month != 0) return 0;
@@ -220,6 +209,7 @@ Status Coercion::ApplyText(Datum& value) {
         if (failure != 0) return Refuse(failure);
         Set(value, Kind::text, text_.data(), length);
     }
+    if (value.kind == Kind::timestamp) SetDate(value.Timestamp(), value);
     // Blanks at the end of a fixed column's text come back when it is read.
     if (column_.type == SQLT_AFC && value.kind == Kind::text) {
         while (value.length > 1 && value.Text().back() == ' ') --value.length;
@@ -244,7 +234,7 @@ Status Coercion::ApplyBytes(Datum& value) {
 }
 
 Status Coercion::ApplySize(const Datum& value) {
-    const bool has_length = value.kind == Kind::text || value.kind == Kind::bytes || value.kind == Kind::timestamp;
+    const bool has_length = value.kind == Kind::text || value.kind == Kind::bytes;
     const std::uint32_t most = column_.characters > 0 ? column_.characters : column_.size;
     if (!has_length || most == 0 || value.length <= most) return {};
     const std::int64_t actual = column_.characters > 0 ? CharacterCount(value.Text()) : value.length;
@@ -255,23 +245,25 @@ Status Coercion::ApplySize(const Datum& value) {
 
 Status Coercion::ApplyDate(Datum& value) {
     if (value.kind != Kind::text && value.kind != Kind::timestamp) return Refuse(errors::kInconsistentTypes);
-    constexpr std::size_t kPlainDate = 19;    // "YYYY-MM-DD HH:MM:SS"
-    const std::string_view text = value.Text();
-    const bool fits = column_.type == SQLT_DAT ? text.size() == kPlainDate : !HasMoreDigits(text, column_.scale);
-    const bool as_it_is = purpose_ == Purpose::compare || fits;
-    if (value.kind == Kind::timestamp && as_it_is && !IsTimeAlone(text)) return {};
-    if (text.empty()) {
+    if (value.kind == Kind::text && value.length == 0) {
         value = {};
         return {};
     }
-    date::DateTime read;
-    int failure = ReadDate(text, column_.type, read);
-    if (column_.type == SQLT_DAT) read.nanosecond = 0;
-    else if (failure == 0 && purpose_ == Purpose::store) failure = date::RoundFraction(read, column_.scale, &read);
+    const bool is_date = value.kind == Kind::timestamp && value.Timestamp().month != 0;
+    const bool stores = purpose_ == Purpose::store;
+    if (value.kind == Kind::timestamp && !is_date) SetDate(value.Timestamp(), value);    // a time alone is read as a text
+    date::DateTime read = is_date ? value.Timestamp() : date::DateTime();
+    int failure = is_date ? 0 : ReadDate(value.Text(), column_.type, read);
+    if (column_.type == SQLT_DAT && (stores || !is_date)) read.nanosecond = 0;
+    else if (failure == 0 && stores) failure = date::RoundFraction(read, column_.scale, &read);
     if (failure != 0) return Refuse(failure);
-    if (column_.type == SQLT_DAT || column_.type == SQLT_TIMESTAMP) read.has_zone = false;
-    Set(value, Kind::timestamp, date_.data(), date::ToEngineText(read, date_.data()));
+    if ((column_.type == SQLT_DAT || column_.type == SQLT_TIMESTAMP) && (stores || !is_date)) read.has_zone = false;
+    SetDate(read, value);
     return {};
+}
+
+void Coercion::SetDate(const date::DateTime& date, Datum& value) {
+    Set(value, Kind::text, date_.data(), date::ToEngineText(date, date_.data()));
 }
 
 }  // namespace engine::sqlite

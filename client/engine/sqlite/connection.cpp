@@ -1,14 +1,13 @@
-// Opening a database, compiling statements, transactions, waiting for locks, cancelling.
+// Compiling statements, transactions, waiting for locks, stopping, and guarding the accounts.
 #include "engine/sqlite/connection.h"
 
-#include <cctype>
+#include <algorithm>
+#include <cerrno>
+#include <new>
 #include <thread>
 
 #include "engine/sqlite/accounts.h"
-#include "engine/sqlite/errors.h"
-#include "engine/sqlite/functions.h"
 #include "engine/sqlite/query.h"
-#include "engine/sqlite/sqlite.h"
 #include "engine/sqlite/value_targets.h"
 #include "handles/errors.h"
 
@@ -21,65 +20,98 @@ constexpr auto kLockWait = 2000ms;    // how long a call waits for another sessi
 constexpr int kStepsBetweenChecks = 2000;
 constexpr std::size_t kLongestStatement = 1000000000;
 
-// Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
-constexpr Dialect::Spelling kTypes[] = {
-    {"decfloat", "kelp_decfloat"},    // without "floa", which would make every value a real
-    {"long raw", "long raw"},
-    {"long", "long varchar"},
-    {"timestamp with local time zone", "timestamp_ltz"},
-    {"timestamp with time zone", "timestamp_tz"},
+// By Own. Marks nest under one name: SQLite takes the last of that name.
+constexpr const char* kOwnTexts[] = {"begin immediate",
+                                     "begin",
+                                     "select 1 from sqlite_schema limit 1",
+                                     "commit",
+                                     "rollback",
+                                     "savepoint kelp_mark",
+                                     "rollback to kelp_mark",
+                                     "release kelp_mark"};
+
+// What may not be done to the accounts, and where the authorizer tells the table.
+struct GuardedRow {
+    int action;
+    bool table_is_second;
+};
+constexpr GuardedRow kGuarded[] = {
+    {SQLITE_INSERT, false},           {SQLITE_UPDATE, false},           {SQLITE_DELETE, false},
+    {SQLITE_CREATE_TABLE, false},     {SQLITE_CREATE_TEMP_TABLE, false}, {SQLITE_CREATE_VTABLE, false},
+    {SQLITE_CREATE_VIEW, false},      {SQLITE_CREATE_TEMP_VIEW, false}, {SQLITE_DROP_TABLE, false},
+    {SQLITE_DROP_VTABLE, false},      {SQLITE_CREATE_INDEX, true},      {SQLITE_CREATE_TEMP_INDEX, true},
+    {SQLITE_DROP_INDEX, true},        {SQLITE_CREATE_TRIGGER, true},    {SQLITE_CREATE_TEMP_TRIGGER, true},
+    {SQLITE_DROP_TRIGGER, true},      {SQLITE_ALTER_TABLE, true},
 };
 
-std::string Placeholder(std::size_t number) { return '?' + std::to_string(number); }
+Status Unsupported(const char* what) { return Error(errors::kUnsupported, what).From("SQLITE"); }
 
-// The text in which dates are kept.
-std::string DateLiteral(const date::DateTime& value) {
-    char text[date::kMaxEngineText];
-    return "'" + std::string(text, date::ToEngineText(value, text)) + "'";
-}
+// Resets a statement when it has run, however that ended.
+class Resetting {
+public:
+    explicit Resetting(sqlite3_stmt* statement) : statement_(statement) {}
+    ~Resetting() { sqlite3_reset(statement_); }
+    Resetting(const Resetting&) = delete;
+    Resetting& operator=(const Resetting&) = delete;
 
-// The number of the row, most significant byte first, behind two bytes for the table.
-std::string RowIdLiteral(const RowId& row) {
-    std::uint64_t number = 0;
-    for (std::size_t index = 2; index < row.bytes.size(); ++index) number = number << 8 | row.bytes[index];
-    return std::to_string(static_cast<std::int64_t>(number));
-}
+private:
+    sqlite3_stmt* const statement_;
+};
 
 }  // namespace
 
-Status Connect(const std::string& file, std::unique_ptr<Connection>& connection) {
-    sqlite3* opened = nullptr;
-    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE;
-    const int code = sqlite3_open_v2(file.c_str(), &opened, flags, nullptr);
-    DatabaseHandle database(opened);
-    if (code != SQLITE_OK) return opened ? Failure(opened, code) : Failure(code, sqlite3_errstr(code));
-    auto made = std::make_unique<SqliteConnection>(std::move(database));
-    Status status = made->Prime();
+// While one lives, nothing stops the call that runs: it ends or undoes.
+class SqliteConnection::Unheeding {
+public:
+    explicit Unheeding(SqliteConnection& connection) : connection_(connection), before_(connection.heeds_) {
+        connection_.heeds_ = false;
+    }
+    ~Unheeding() { connection_.heeds_ = before_; }
+    Unheeding(const Unheeding&) = delete;
+    Unheeding& operator=(const Unheeding&) = delete;
+
+private:
+    SqliteConnection& connection_;
+    const bool before_;
+};
+
+// ---- Beginning and end
+
+SqliteConnection::SqliteConnection(std::shared_ptr<Home> home, std::shared_ptr<const StopRequest> stop)
+    : home_(std::move(home)), stop_(std::move(stop)) {}
+
+Status SqliteConnection::Make(std::shared_ptr<Home> home, std::shared_ptr<const StopRequest> stop,
+                              std::unique_ptr<SqliteConnection>& connection) {
+    std::unique_ptr<SqliteConnection> made(new SqliteConnection(std::move(home), std::move(stop)));
+    Status status = made->home_->Take(made->handle_);
+    if (status.Failed()) return status;
+    sqlite3* database = made->Database();
+    sqlite3_busy_handler(database, OnBusy, made.get());
+    sqlite3_progress_handler(database, kStepsBetweenChecks, OnProgress, made.get());
+    sqlite3_update_hook(database, OnChange, made.get());
+    sqlite3_set_authorizer(database, OnAccess, made.get());
+    made->utf8_ = made->Encoding() == "UTF-8";
+    connection = std::move(made);
+    return status;
+}
+
+// Closing rolls back, as does giving the handle back.
+SqliteConnection::~SqliteConnection() {
+    if (!handle_.database) return;
+    for (StatementHandle& own : owns_) own.reset();
+    sqlite3_busy_handler(Database(), nullptr, nullptr);
+    sqlite3_progress_handler(Database(), 0, nullptr, nullptr);
+    sqlite3_update_hook(Database(), nullptr, nullptr);
+    sqlite3_set_authorizer(Database(), nullptr, nullptr);
+    home_->GiveBack(std::move(handle_));
+}
+
+Status SqliteConnection::Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) {
+    if (Private()) return Unsupported("a database in memory has one connection");
+    std::unique_ptr<SqliteConnection> made;
+    Status status = Make(home_, std::move(stop), made);
     if (status.Ok()) connection = std::move(made);
     return status;
-}
-
-SqliteConnection::SqliteConnection(DatabaseHandle database) : database_(std::move(database)) {
-    sqlite3_busy_handler(database_.get(), OnBusy, this);
-    sqlite3_progress_handler(database_.get(), kStepsBetweenChecks, OnProgress, this);
-    sqlite3_update_hook(database_.get(), OnChange, this);
-}
-
-SqliteConnection::~SqliteConnection() = default;    // closing rolls back
-
-Status SqliteConnection::Prime() {
-    private_ = *sqlite3_db_filename(database_.get(), "main") == '\0';
-    Status status = AddFunctions(database_.get());
-    if (status.Ok()) status = Run("select count(*) from sqlite_schema");    // not a database; cannot be read
-    // A file that cannot be written, or that somebody is using in another way, keeps the journal it has.
-    if (status.Ok() && !private_) (void)Run("pragma journal_mode=wal");
-    if (status.Ok()) status = Run("pragma foreign_keys=on");
-    if (status.Ok()) utf8_ = Text("pragma encoding") == "UTF-8";
-    return status;
-}
-
-Status SqliteConnection::Authenticate(const Credentials& credentials) {
-    return engine::sqlite::Authenticate(*this, credentials);
 }
 
 Status SqliteConnection::ChangePassword(const std::string& user, const std::string& old_password,
@@ -87,57 +119,109 @@ Status SqliteConnection::ChangePassword(const std::string& user, const std::stri
     return engine::sqlite::ChangePassword(*this, user, old_password, new_password);
 }
 
-Status SqliteConnection::Prepare(std::string_view sql, std::unique_ptr<Query>& query, std::uint32_t& error_offset) {
+Status SqliteConnection::Ping() { return Run(Own::look); }
+
+std::string SqliteConnection::Encoding() {
+    int code = SQLITE_OK;
+    const StatementHandle statement = CompileText("pragma encoding", code, nullptr);
+    if (!statement || sqlite3_step(statement.get()) != SQLITE_ROW) throw std::bad_alloc();    // nothing else can fail
+    return reinterpret_cast<const char*>(sqlite3_column_text(statement.get(), 0));
+}
+
+// ---- Statements
+
+Status SqliteConnection::Compile(const StatementSource& source, std::unique_ptr<Query>& query,
+                                 std::uint32_t& error_offset) {
+    const std::string_view sql = source.sql;
     if (sql.size() > kLongestStatement) return Error(errors::kStatementTooLong).From("SQLITE");
-    sqlite3* database = database_.get();
+    sqlite3* database = Database();
     int code = SQLITE_OK;
     std::size_t end = 0;
-    StatementHandle statement = Compile(sql, code, &end);
+    StatementHandle statement = CompileText(sql, code, &end);
     if (code != SQLITE_OK) {
         const int offset = sqlite3_error_offset(database);
         if (offset >= 0) error_offset = static_cast<std::uint32_t>(offset);
         return Failure(database, code);
     }
     if (!statement) return Error(errors::kInvalidStatement).From("SQLITE");
-    if (Compile(sql.substr(end), code, nullptr) || code != SQLITE_OK) {
+    if (CompileText(sql.substr(end), code, nullptr) || (code & 0xFF) == SQLITE_ERROR || code == SQLITE_AUTH) {
         error_offset = static_cast<std::uint32_t>(end);
         return Error(errors::kNotProperlyEnded).From("SQLITE");
     }
+    if (code != SQLITE_OK) return Failure(database, code);
 
     ValueTargets targets;
     if (Status status = FindValueTargets(database, sql, targets); status.Failed()) return status;
     const std::string rewritten = targets.Rewritten(sql);
     if (!rewritten.empty()) {
-        StatementHandle checked = Compile(rewritten, code, nullptr);
+        StatementHandle checked = CompileText(rewritten, code, nullptr);
         if (code != SQLITE_OK) return Failure(database, code);
         statement = std::move(checked);
     }
-    auto made = std::make_unique<SqliteQuery>(*this, std::move(statement), sql);
+    auto made = std::make_unique<SqliteQuery>(*this, std::move(statement), sql, source.effect);
     for (const auto& parameter : targets.parameters) made->UseFor(parameter.index, parameter.column, parameter.purpose);
     query = std::move(made);
     return {};
 }
 
 // `end` tells where the statement ends in the text. None for a text without a statement.
-StatementHandle SqliteConnection::Compile(std::string_view sql, int& code, std::size_t* end) {
+StatementHandle SqliteConnection::CompileText(std::string_view sql, int& code, std::size_t* end) {
     sqlite3_stmt* compiled = nullptr;
     const char* rest = nullptr;
-    code = sqlite3_prepare_v3(database_.get(), sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
+    code = sqlite3_prepare_v3(Database(), sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
                               &compiled, &rest);
     if (end && rest) *end = static_cast<std::size_t>(rest - sql.data());
     return StatementHandle(compiled);
 }
 
-Status SqliteConnection::Begin() {
+Status SqliteConnection::OpenCursor(const Datum&, std::unique_ptr<Query>&) { return Error(errors::kInconsistentTypes); }
+
+Status SqliteConnection::CompileOwn(Own own) {
+    const auto index = static_cast<std::size_t>(own);
+    if (owns_[index]) return {};
+    int code = SQLITE_OK;
+    owns_[index] = CompileText(kOwnTexts[index], code, nullptr);
+    return code == SQLITE_OK ? Status() : Failure(Database(), code);
+}
+
+Status SqliteConnection::Run(Own own) {
+    Status status = CompileOwn(own);
+    if (status.Failed()) return status;
+    sqlite3_stmt* statement = owns_[static_cast<std::size_t>(own)].get();
+    const Resetting resetting(statement);
+    errno = 0;
+    const int code = sqlite3_step(statement);
+    return code == SQLITE_DONE || code == SQLITE_ROW ? Status() : Failed(code, Verb::other, false);
+}
+
+// ---- Transactions
+
+// What will end the transaction is made ready before it begins.
+Status SqliteConnection::Begin(TransactionMode mode) {
     if (InTransaction()) return {};
+    for (const Own own : {Own::commit, Own::rollback}) {
+        if (Status status = CompileOwn(own); status.Failed()) return status;
+    }
     ReadAhead(nullptr);
-    return Run("begin immediate");
+    read_only_ = mode == TransactionMode::read_only;
+    if (mode == TransactionMode::read_write) return Run(Own::begin);
+    Status status = Run(Own::begin_reading);
+    return status.Ok() ? LookOrEnd() : status;
+}
+
+// SQLite begins to read when something is read: now. The lock for writing comes with the first change, and is refused
+// (8177) if somebody has changed the database since.
+Status SqliteConnection::LookOrEnd() {
+    Status status = Run(Own::look);
+    if (status.Failed()) (void)Rollback();    // the first failure counts
+    return status;
 }
 
 // A deferred constraint that fails at the end undoes the transaction, as does a file that cannot take it.
 Status SqliteConnection::Commit() {
     if (!InTransaction()) return {};
-    Status status = Run("commit");
+    const Unheeding undisturbed(*this);
+    Status status = Run(Own::commit);
     if (!status.Ok() && !InTransaction()) return RolledBack(status);
     if (status.Number() != errors::kParentMissing && status.Number() != errors::kChildFound) return status;
     Status undone = Rollback();
@@ -146,85 +230,131 @@ Status SqliteConnection::Commit() {
 
 Status SqliteConnection::Rollback() {
     if (!InTransaction()) return {};
+    const Unheeding undisturbed(*this);
     ReadAhead(nullptr);
-    return Run("rollback");
+    return Run(Own::rollback);
 }
 
-Status SqliteConnection::Ping() { return Run("select count(*) from sqlite_schema"); }
-
-std::string SqliteConnection::ServerVersion() {
-    std::string text = std::string("KELP embedded engine, SQLite ") + sqlite3_libversion() + "\nDatabase ";
-    return text += private_ ? "in memory" : sqlite3_db_filename(database_.get(), "main");
+Status SqliteConnection::SetMark() {
+    for (const Own own : {Own::undo, Own::drop}) {
+        if (Status status = CompileOwn(own); status.Failed()) return status;
+    }
+    Status status = Begin(TransactionMode::read_write);
+    return status.Ok() ? Run(Own::mark) : status;
 }
 
-const Dialect& SqliteConnection::GetDialect() const {
-    static constexpr Dialect kDialect{
-        .placeholder = Placeholder,
-        .types = kTypes,
-        .functions = kMoments,
-        .casts = kCasts,
-        .counts_characters = kCountsCharacters,
-        .dual = "(select 'X' as dummy)",
-        .minus = "except",
-        .truncate_table = "delete from",
-        .cuts_for_update = true,
-        .date_literal = DateLiteral,
-        .row_id_literal = RowIdLiteral,
-    };
-    return kDialect;
+Status SqliteConnection::UndoToMark() {
+    const Unheeding undisturbed(*this);
+    ReadAhead(nullptr);
+    Status status;
+    try {
+        status = Run(Own::undo);
+    } catch (const std::bad_alloc&) {
+        status = Error(errors::kOutOfMemory).From("SQLITE");
+    }
+    if (status.Ok() || status.Number() == errors::kNoSuchSavepoint) return status;
+    Status undone = Rollback();
+    return undone.Failed() ? undone : RolledBack(status);
 }
+
+Status SqliteConnection::DropMark() {
+    const Unheeding undisturbed(*this);
+    return Run(Own::drop);
+}
+
+Status SqliteConnection::Prepare(const Xid&, bool&) { return Unsupported("two-phase commit"); }
+Status SqliteConnection::CommitPrepared(const Xid&) { return Unsupported("two-phase commit"); }
+Status SqliteConnection::RollbackPrepared(const Xid&) { return Unsupported("two-phase commit"); }
+Status SqliteConnection::Recover(std::vector<Xid>&) { return Unsupported("two-phase commit"); }
+
+// Outside a transaction an older query's rows would keep a new one from seeing what others have committed since.
+Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, bool& began) {
+    began = false;
+    broken_ = broken_ || !home_->Unchanged(handle_);
+    if (broken_) return Error(errors::kEndOfChannel, "the read-only file has changed").From("SQLITE");
+    if (entry.effect == Effect::defines) {
+        if (Status status = Commit(); status.Failed()) return status;
+    }
+    const bool writes = entry.effect == Effect::changes || entry.effect == Effect::locks;
+    if (InTransaction()) {
+        const bool reads = !writes && (entry.effect != Effect::controls || entry.read_only);
+        if (read_only_ && !reads) return Error(errors::kReadOnlyTransaction).From("SQLITE");
+    } else if (writes || entry.begins) {
+        Status status = Begin(TransactionMode::read_write);
+        began = status.Ok();
+        return status;
+    }
+    const bool goes_stale = !InTransaction() && !Private();
+    if (!entry.read_only || entry.effect == Effect::controls || goes_stale) ReadAhead(query);
+    return {};
+}
+
+void SqliteConnection::Abandon() noexcept {
+    try {
+        (void)Rollback();    // nothing is lost: there was nothing yet
+    } catch (const std::bad_alloc&) {
+    }
+}
+
+// ---- Open queries
 
 void SqliteConnection::Join(SqliteQuery& query) noexcept {
-    query.next_ = first_open_;
+    query.next_open_ = first_open_;
     if (first_open_) first_open_->previous_ = &query;
     first_open_ = &query;
 }
 
 void SqliteConnection::Leave(SqliteQuery& query) noexcept {
-    if (query.previous_) query.previous_->next_ = query.next_;
-    else if (first_open_ == &query) first_open_ = query.next_;
-    if (query.next_) query.next_->previous_ = query.previous_;
-    query.previous_ = query.next_ = nullptr;
+    if (query.previous_) query.previous_->next_open_ = query.next_open_;
+    else if (first_open_ == &query) first_open_ = query.next_open_;
+    if (query.next_open_) query.next_open_->previous_ = query.previous_;
+    query.previous_ = query.next_open_ = nullptr;
 }
 
-void SqliteConnection::ReadAhead(const SqliteQuery* except) {
+void SqliteConnection::ReadAhead(const SqliteQuery* except) noexcept {
     for (SqliteQuery* query = first_open_; query;) {
-        SqliteQuery* next = query->next_;    // reading ahead takes the query off the list
+        SqliteQuery* next = query->next_open_;    // reading ahead takes the query off the list
         if (query != except) query->ReadAhead();
         query = next;
     }
 }
 
-int SqliteConnection::OnProgress(void* self) { return static_cast<SqliteConnection*>(self)->Cancelled(); }
+// ---- What SQLite asks
+
+int SqliteConnection::OnProgress(void* self) { return static_cast<SqliteConnection*>(self)->Stopping(); }
 
 int SqliteConnection::OnBusy(void* self, int attempts) {
     auto& connection = *static_cast<SqliteConnection*>(self);
     const auto now = std::chrono::steady_clock::now();
     if (attempts == 0) connection.busy_since_ = now;
-    if (connection.Cancelled() || now - connection.busy_since_ > kLockWait) return 0;
+    if (connection.Stopping() || now - connection.busy_since_ > kLockWait) return 0;
     std::this_thread::sleep_for(std::min(1ms * (attempts + 1), 20ms));
     return 1;
 }
 
 void SqliteConnection::OnChange(void* self, int, const char*, const char*, sqlite3_int64 row) {
-    static_cast<SqliteConnection*>(self)->last_row_ = row;
+    static_cast<SqliteConnection*>(self)->changed_row = row;
 }
 
-Status SqliteConnection::Run(const char* sql) {
-    const int code = sqlite3_exec(database_.get(), sql, nullptr, nullptr, nullptr);
-    if (code == SQLITE_OK) return {};
-    if (!Cancelled()) return Failure(database_.get(), code);
-    ForgetCancel();    // it ended the wait for a lock
-    return Error(errors::kCancelled).From("SQLITE");
+// Names of users may be read; hashes are nobody's business.
+int SqliteConnection::OnAccess(void* self, int action, const char* first, const char* second, const char*,
+                               const char*) {
+    if (static_cast<SqliteConnection*>(self)->trusted_) return SQLITE_OK;
+    const auto is = [](const char* name, const char* wanted) { return name && sqlite3_stricmp(name, wanted) == 0; };
+    if (action == SQLITE_READ) return is(first, kAccounts) && is(second, kPasswords) ? SQLITE_DENY : SQLITE_OK;
+    for (const GuardedRow& row : kGuarded) {
+        if (row.action == action) return is(row.table_is_second ? second : first, kAccounts) ? SQLITE_DENY : SQLITE_OK;
+    }
+    return SQLITE_OK;
 }
 
-std::string SqliteConnection::Text(const char* sql) {
-    sqlite3_stmt* compiled = nullptr;
-    sqlite3_prepare_v2(database_.get(), sql, -1, &compiled, nullptr);
-    const StatementHandle statement(compiled);
-    if (!compiled || sqlite3_step(compiled) != SQLITE_ROW) return {};
-    const auto* text = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
-    return text ? text : "";
+Status SqliteConnection::Stopped() { return Error(errors::kCancelled).From("SQLITE"); }
+
+// A wait for a lock that was given up because of the request is a call that was stopped, too.
+Status SqliteConnection::Failed(int code, Verb verb, bool was_in_transaction) {
+    const bool may_be_stopped = (code & 0xFF) == SQLITE_INTERRUPT || (code & 0xFF) == SQLITE_BUSY;
+    Status status = may_be_stopped && Stopping() ? Stopped() : Failure(Database(), code, verb);
+    return was_in_transaction && !InTransaction() ? RolledBack(status) : status;
 }
 
 }  // namespace engine::sqlite

@@ -1,79 +1,129 @@
-// A connection to a SQLite database: transactions, cancelling, and the queries that are open on it.
+// One user's session on a SQLite database: transactions, marks, stopping, the queries that are open on it, and what
+// its statements may not touch.
 #pragma once
 
 #include <sqlite3.h>
 
-#include <atomic>
+#include <array>
 #include <chrono>
+#include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "engine/engine.h"
+#include "engine/sqlite/errors.h"
+#include "engine/sqlite/home.h"
 
 namespace engine::sqlite {
 
 class SqliteQuery;
 
-struct DatabaseCloser {
-    void operator()(sqlite3* database) const { sqlite3_close_v2(database); }
-};
-struct StatementCloser {
-    void operator()(sqlite3_stmt* statement) const { sqlite3_finalize(statement); }
-};
-using DatabaseHandle = std::unique_ptr<sqlite3, DatabaseCloser>;
-using StatementHandle = std::unique_ptr<sqlite3_stmt, StatementCloser>;
-
 class SqliteConnection final : public Connection {
 public:
-    explicit SqliteConnection(DatabaseHandle database);
+    // A connection on a handle of its own, with nobody logged on yet.
+    static Status Make(std::shared_ptr<Home> home, std::shared_ptr<const StopRequest> stop,
+                       std::unique_ptr<SqliteConnection>& connection);
     ~SqliteConnection() override;
     SqliteConnection(const SqliteConnection&) = delete;
     SqliteConnection& operator=(const SqliteConnection&) = delete;
 
-    // What follows opening: settings, functions, a first look at the file. The last step of Connect.
-    Status Prime();
-
-    Status Authenticate(const Credentials& credentials) override;
     Status ChangePassword(const std::string& user, const std::string& old_password,
                           const std::string& new_password) override;
-    Status Prepare(std::string_view sql, std::unique_ptr<Query>& query, std::uint32_t& error_offset) override;
-    Status Begin() override;
+    Status Compile(const StatementSource& source, std::unique_ptr<Query>& query, std::uint32_t& error_offset) override;
+    Status OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) override;
+    Status Begin(TransactionMode mode) override;
     Status Commit() override;
     Status Rollback() override;
-    bool InTransaction() const override { return sqlite3_get_autocommit(database_.get()) == 0; }
+    [[nodiscard]] bool InTransaction() const override { return sqlite3_get_autocommit(Database()) == 0; }
+    Status SetMark() override;
+    Status UndoToMark() override;
+    Status DropMark() override;
+    Status Prepare(const Xid& xid, bool& read_only) override;
+    Status CommitPrepared(const Xid& xid) override;
+    Status RollbackPrepared(const Xid& xid) override;
+    Status Recover(std::vector<Xid>& prepared) override;
+    Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
+    void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { stop_ = std::move(stop); }
+    Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
+    LobStore* Lobs() override { return nullptr; }
     Status Ping() override;
-    std::string ServerVersion() override;
-    void Cancel() noexcept override { cancelled_.store(true, std::memory_order_relaxed); }
-    void ForgetCancel() noexcept override { cancelled_.store(false, std::memory_order_relaxed); }
-    std::int64_t LastRowNumber() const override { return last_row_; }
-    const Dialect& GetDialect() const override;
-    std::string_view EngineName() const override { return "SQLITE"; }
+    [[nodiscard]] bool Broken() const override { return broken_; }
+    void Interrupt() noexcept override {}    // a call looks at the request by itself, again and again
 
-    // For queries.
-    [[nodiscard]] sqlite3* Database() const { return database_.get(); }
-    [[nodiscard]] bool Utf8() const { return utf8_; }         // how the file keeps texts
-    [[nodiscard]] bool Private() const { return private_; }   // nobody else can open the database
-    [[nodiscard]] bool Cancelled() const { return cancelled_.load(std::memory_order_relaxed); }
-    void ForgetLastRow() { last_row_ = 0; }
+    // ---- For queries, descriptions and accounts
+
+    [[nodiscard]] sqlite3* Database() const { return handle_.database.get(); }
+    [[nodiscard]] bool Utf8() const { return utf8_; }                      // how the file keeps texts
+    [[nodiscard]] bool Private() const { return home_->Private(); }        // nobody else can open the database
+    [[nodiscard]] const std::string& File() const { return home_->File(); }
+
+    // Whether the call that runs is to stop; and the answer of one that does.
+    [[nodiscard]] bool Stopping() const { return heeds_ && stop_ && stop_->Asked(); }
+    [[nodiscard]] static Status Stopped();
+    // The status of a call on the database that has just failed.
+    Status Failed(int code, Verb verb, bool was_in_transaction);
+
+    // What a statement needs to run.
+    struct Entry {
+        Effect effect = Effect::reads;
+        bool read_only = false;    // by SQLite's word
+        bool begins = false;       // a savepoint: it stands in a transaction
+    };
+    // Makes way for a statement: ends or begins a transaction, and has the open queries but `query` read ahead.
+    Status Enter(const Entry& entry, const SqliteQuery* query, bool& began);
+    // Ends a transaction that Enter began for a statement that then did nothing.
+    void Abandon() noexcept;
     void Join(SqliteQuery& query) noexcept;     // the query has rows to come
     void Leave(SqliteQuery& query) noexcept;
     // Lets the open queries but `except` read the rest of their rows, so that none holds an old state of the database.
-    void ReadAhead(const SqliteQuery* except);
+    void ReadAhead(const SqliteQuery* except) noexcept;
+    std::optional<std::int64_t> changed_row;    // the last one, for whoever emptied it before
+
+    // While one lives, statements may read and change the accounts.
+    class Trusted {
+    public:
+        explicit Trusted(SqliteConnection& connection) : connection_(connection), before_(connection.trusted_) {
+            connection_.trusted_ = true;
+        }
+        ~Trusted() { connection_.trusted_ = before_; }
+        Trusted(const Trusted&) = delete;
+        Trusted& operator=(const Trusted&) = delete;
+
+    private:
+        SqliteConnection& connection_;
+        const bool before_;
+    };
 
 private:
+    // The connection's own statements, compiled when they are first needed and kept: those that end or undo need no
+    // memory then.
+    enum class Own : std::uint8_t { begin, begin_reading, look, commit, rollback, mark, undo, drop };
+    static constexpr std::size_t kOwns = static_cast<std::size_t>(Own::drop) + 1;
+    class Unheeding;
+
+    SqliteConnection(std::shared_ptr<Home> home, std::shared_ptr<const StopRequest> stop);
     static int OnProgress(void* self);
     static int OnBusy(void* self, int attempts);
     static void OnChange(void* self, int operation, const char* schema, const char* table, sqlite3_int64 row);
-    StatementHandle Compile(std::string_view sql, int& code, std::size_t* end);
-    Status Run(const char* sql);
-    std::string Text(const char* sql);    // the first column of the first row
+    static int OnAccess(void* self, int action, const char* first, const char* second, const char* schema,
+                        const char* trigger);
+    StatementHandle CompileText(std::string_view sql, int& code, std::size_t* end);
+    Status CompileOwn(Own own);
+    Status Run(Own own);
+    Status LookOrEnd();
+    std::string Encoding();
 
-    DatabaseHandle database_;
-    std::atomic<bool> cancelled_{false};
-    std::chrono::steady_clock::time_point busy_since_;
-    std::int64_t last_row_ = 0;
+    std::shared_ptr<Home> home_;
+    OpenHandle handle_;
+    std::shared_ptr<const StopRequest> stop_;
+    std::array<StatementHandle, kOwns> owns_;
+    bool heeds_ = true;                // the call that runs looks at stop_
+    bool trusted_ = false;
+    bool read_only_ = false;           // the transaction, if there is one
+    bool broken_ = false;
     bool utf8_ = true;
-    bool private_ = false;
+    std::chrono::steady_clock::time_point busy_since_;
     SqliteQuery* first_open_ = nullptr;
 };
 

@@ -1,13 +1,17 @@
-// Binding, stepping and reading. Nothing is allocated for a row.
+// Binding, stepping and reading. Nothing is allocated for a row that is delivered.
 #include "engine/sqlite/query.h"
 
 #include <algorithm>
-#include <cctype>
+#include <cerrno>
 #include <limits>
+#include <new>
+#include <optional>
 
 #include "engine/sqlite/characters.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/describe.h"
+#include "engine/sqlite/pieces.h"
+#include "engine/sqlite/row_number.h"
 #include "engine/sqlite/stored_number.h"
 #include "handles/errors.h"
 
@@ -16,15 +20,59 @@ namespace {
 
 int Length(const Datum& value) { return static_cast<int>(value.length); }
 
+Status NoMemory() { return Error(errors::kOutOfMemory).From("SQLITE"); }
+
+void SetView(Datum& value, Kind kind, const void* data, std::size_t length) {
+    value.kind = kind;
+    value.data = data;
+    value.length = static_cast<std::uint32_t>(length);
+}
+
+bool IsSavepoint(std::string_view sql) {
+    Pieces pieces(sql);
+    return IsWord(pieces.Next(), "savepoint");
+}
+
+// Whether two more failures can be noted: one, and that there is no room for others.
+bool HasRoom(std::vector<ArrayOutcome::Failure>& failures) noexcept {
+    try {
+        if (failures.capacity() - failures.size() < 2) failures.reserve(2 * failures.size() + 2);
+        return true;
+    } catch (const std::bad_alloc&) {
+        return false;
+    }
+}
+
+// What Enter began is ended if nothing is done in it, and the statement reset, whatever is thrown.
+class Running {
+public:
+    Running(SqliteConnection& connection, sqlite3_stmt* statement) : connection_(connection), statement_(statement) {}
+    ~Running() {
+        if (statement_) sqlite3_reset(statement_);
+        if (began) connection_.Abandon();
+    }
+    Running(const Running&) = delete;
+    Running& operator=(const Running&) = delete;
+    void GoesOn() {
+        statement_ = nullptr;
+        began = false;
+    }
+
+    bool began = false;
+
+private:
+    SqliteConnection& connection_;
+    sqlite3_stmt* statement_;
+};
+
 }  // namespace
 
-SqliteQuery::SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql)
+SqliteQuery::SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql, Effect effect)
     : connection_(connection),
       statement_(std::move(statement)),
       sql_(sql),
       verb_(VerbOf(sql_)),
-      changes_rows_(verb_ != Verb::other),
-      read_only_(sqlite3_stmt_readonly(statement_.get()) != 0),
+      entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && IsSavepoint(sql)},
       parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))),
       coercions_(parameters_.size()) {}
 
@@ -34,15 +82,29 @@ void SqliteQuery::UseFor(std::size_t parameter, const Column& column, Coercion::
     if (parameter < coercions_.size()) coercions_[parameter] = std::make_unique<Coercion>(column, purpose);
 }
 
+// ---- The select list
+
+// SQLite compiles a statement anew when its tables have changed.
+int SqliteQuery::Recompilations() const {
+    return sqlite3_stmt_status(statement_.get(), SQLITE_STMTSTATUS_REPREPARE, 0);
+}
+
 const std::vector<Column>& SqliteQuery::Columns() {
-    const auto count = static_cast<std::size_t>(sqlite3_column_count(statement_.get()));
-    if (columns_.size() != count) {    // not described yet, or its tables have changed
-        columns_.clear();
-        untyped_.clear();
-        DescribeColumns(connection_.Database(), statement_.get(), sql_, columns_, untyped_);
-        PlanReading();
-    }
+    if (!described_ || described_at_ != Recompilations()) Describe();
     return columns_;
+}
+
+void SqliteQuery::Describe() {
+    described_ = false;
+    described_at_ = Recompilations();
+    columns_.clear();
+    untyped_.clear();
+    if (sqlite3_column_count(statement_.get()) > 0) {
+        DescribeColumns(connection_.Database(), statement_.get(), sql_, columns_, untyped_);
+    }
+    any_untyped_ = std::find(untyped_.begin(), untyped_.end(), true) != untyped_.end();
+    PlanReading();
+    described_ = true;
 }
 
 SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
@@ -61,18 +123,29 @@ SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
 void SqliteQuery::PlanReading() {
     readings_.clear();
     for (const Column& column : columns_) readings_.push_back(ReadingOf(column));
-    numbers_.resize(columns_.size());
-    padded_.resize(columns_.size());
+    rooms_.resize(columns_.size());
+    values_.resize(columns_.size());
 }
 
 // What no declaration tells, the first row does.
 void SqliteQuery::DescribeFromRow() {
     Columns();
+    if (!any_untyped_) return;
     for (std::size_t index = 0; index < columns_.size(); ++index) {
         if (!untyped_[index]) continue;
         DescribeValue(sqlite3_column_value(statement_.get(), static_cast<int>(index)), columns_[index]);
     }
     PlanReading();
+}
+
+// ---- Binding
+
+Status SqliteQuery::BindDate(int index, const date::DateTime& value, bool copy) {
+    if (dates_.empty()) dates_.resize(parameters_.size());
+    DateText& text = dates_[static_cast<std::size_t>(index) - 1];
+    Datum written;
+    SetView(written, Kind::text, text.data(), date::ToEngineText(value, text.data()));
+    return Bind(index, written, copy);
 }
 
 Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
@@ -81,12 +154,11 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
     int code = SQLITE_OK;
     switch (value.kind) {
         case Kind::null: code = sqlite3_bind_null(statement, index); break;
-        case Kind::integer:
-        case Kind::row_id:
-        case Kind::lob: code = sqlite3_bind_int64(statement, index, value.integer); break;
+        case Kind::integer: code = sqlite3_bind_int64(statement, index, value.integer); break;
+        case Kind::row_id: code = sqlite3_bind_int64(statement, index, RowNumber(value.Row())); break;
         case Kind::real: code = sqlite3_bind_double(statement, index, value.real); break;
+        case Kind::timestamp: return BindDate(index, value.Timestamp(), copy);
         case Kind::text:
-        case Kind::timestamp:
             code = sqlite3_bind_text(statement, index, value.length ? static_cast<const char*>(value.data) : "",
                                      Length(value), keep);
             break;
@@ -94,13 +166,14 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
             code = sqlite3_bind_blob(statement, index, value.length ? value.data : "", Length(value), keep);
             break;
         case Kind::decimal: {
-            const StoredNumber number = StoredNumber::From(*static_cast<const OCINumber*>(value.data));
+            const StoredNumber number = StoredNumber::From(value.Number());
             if (number.form == StoredNumber::Form::null) return Error(errors::kInvalidNumber);
             if (number.form == StoredNumber::Form::integer) code = sqlite3_bind_int64(statement, index, number.integer);
             else if (number.form == StoredNumber::Form::real) code = sqlite3_bind_double(statement, index, number.real);
             else code = sqlite3_bind_blob(statement, index, number.blob, number.length, SQLITE_TRANSIENT);
             break;
         }
+        case Kind::lob:
         case Kind::cursor: return Error(errors::kInconsistentTypes);
     }
     return code == SQLITE_OK ? Status() : Failure(connection_.Database(), code);
@@ -116,157 +189,303 @@ Status SqliteQuery::BindRow(RowSource& source, std::uint32_t row, bool copy) {
     return status;
 }
 
-// A call that was stopped says so, whatever it was in the middle of.
-Status SqliteQuery::Stopped(int code) {
-    if (!connection_.Cancelled()) return Failure(connection_.Database(), code, verb_);
-    connection_.ForgetCancel();
-    return Error(errors::kCancelled).From("SQLITE");
-}
-
 Status SqliteQuery::Step(bool& has_row) {
+    has_row = false;
+    if (connection_.Stopping()) return SqliteConnection::Stopped();
     const bool in_transaction = connection_.InTransaction();
-    const int code = connection_.Cancelled() ? SQLITE_INTERRUPT : sqlite3_step(statement_.get());
+    errno = 0;    // a write that fails tells why
+    const int code = sqlite3_step(statement_.get());
     has_row = code == SQLITE_ROW;
-    if (has_row || code == SQLITE_DONE) return {};
-    Status status = Stopped(code & 0xFF);
-    return in_transaction && !connection_.InTransaction() ? RolledBack(status) : status;
+    return has_row || code == SQLITE_DONE ? Status() : connection_.Failed(code, verb_, in_transaction);
 }
 
-Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, std::uint64_t& affected) {
-    Status status = BindRow(source, row, false);
-    bool has_row = status.Ok();
-    while (has_row && status.Ok()) status = Step(has_row);
-    if (status.Ok() && changes_rows_) affected += static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
-    sqlite3_reset(statement_.get());
+// ---- Changes
+
+// Steps through an execution; its rows go to the sink.
+Status SqliteQuery::RunRow(std::uint32_t row, RowSink* returned) {
+    bool has_row = false;
+    Status status = Step(has_row);
+    if (has_row && returned) Columns();
+    while (has_row) {
+        if (returned) {
+            Fill();
+            status = returned->Row(row, values_);
+        }
+        if (status.Ok()) status = Step(has_row);
+        if (!status.Ok()) break;
+    }
     return status;
 }
 
-Status SqliteQuery::ExecuteArray(RowSource& source, std::uint32_t first, std::uint32_t last, bool all_rows,
-                                 ArrayOutcome& outcome) {
+// What a sink refuses must be undone, which SQLite does for its own failures alone: then the execution has a mark.
+Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) {
+    Status status = BindRow(source, row, false);
+    if (!status.Ok()) return status;
+    const bool marked = returned && connection_.InTransaction() && sqlite3_column_count(statement_.get()) > 0;
+    if (marked) status = connection_.SetMark();
+    if (!status.Ok()) return status;
+    try {
+        status = RunRow(row, returned);
+    } catch (const std::bad_alloc&) {
+        status = NoMemory();
+    }
+    if (status.Ok() && verb_ != Verb::other) {
+        affected += static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
+    }
+    sqlite3_reset(statement_.get());
+    if (!marked || !connection_.InTransaction()) return status;
+    Status undone = status.Ok() ? Status() : connection_.UndoToMark();
+    Status dropped = connection_.InTransaction() ? connection_.DropMark() : Status();
+    if (undone.Failed()) return undone;
+    return status.Ok() ? dropped : status;
+}
+
+Status SqliteQuery::TryRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) noexcept {
+    try {
+        return ExecuteRow(source, row, returned, affected);
+    } catch (const std::bad_alloc&) {
+        return NoMemory();
+    }
+}
+
+Status SqliteQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) {
     Close();
-    if (!read_only_) connection_.ReadAhead(this);
-    connection_.ForgetLastRow();
+    if (connection_.Stopping()) return SqliteConnection::Stopped();
+    std::vector<ArrayOutcome::Failure>& failures = outcome.failures;
+    failures.reserve(failures.size() + 2);
+    Running running(connection_, statement_.get());
+    Status status = connection_.Enter(entry_, this, running.began);
+    if (status.Failed()) return status;
     const bool in_transaction = connection_.InTransaction();
-    for (std::uint32_t row = first; row < last; ++row) {
-        Status status = ExecuteRow(source, row, outcome.affected);
+    std::optional<std::int64_t> last_row;
+    for (std::uint32_t row = run.first; row < run.last; ++row) {
+        connection_.changed_row.reset();
+        status = TryRow(source, row, run.returned, outcome.affected);
         if (status.Ok()) {
             ++outcome.executed;
+            running.began = false;
+            if (connection_.changed_row) last_row = connection_.changed_row;
             continue;
         }
-        if (in_transaction && !connection_.InTransaction()) return status;
-        const bool stop = !all_rows || status.Number() == errors::kCancelled;
-        outcome.failures.push_back({row, std::move(status)});
-        if (stop) break;
+        if (in_transaction && !connection_.InTransaction()) break;
+        const bool stops = !run.all_rows || status.Number() == errors::kCancelled;
+        failures.push_back({row, std::move(status)});
+        status = {};
+        if (stops) break;
+        if (HasRoom(failures)) continue;
+        if (row + 1 < run.last) failures.push_back({row + 1, NoMemory()});
+        break;
     }
+    if (last_row) outcome.last_row = RowIdOf(*last_row);
+    sqlite3_clear_bindings(statement_.get());    // they point to the source's values
+    return status;
+}
+
+// ---- Queries
+
+// Binds and makes the first step, which a later row's views must not depend on: values are copied.
+Status SqliteQuery::Start(RowSource& source, std::uint32_t row, bool& has_row) {
+    Status status = BindRow(source, row, true);
+    if (status.Ok()) status = Step(has_row);
+    if (status.Ok() && has_row) DescribeFromRow();
+    else if (status.Ok()) Columns();
+    return status;
+}
+
+Status SqliteQuery::Open(RowSource& source, const QueryRun& run) {
+    Close();
+    if (connection_.Stopping()) return SqliteConnection::Stopped();
+    Running running(connection_, statement_.get());
+    Status status = connection_.Enter(entry_, this, running.began);
+    bool has_row = false;
+    if (status.Ok()) status = Start(source, run.row, has_row);
+    if (!status.Ok()) return status;
+    scrollable_ = run.scrollable;
+    running.began = false;
+    if (!has_row) {
+        state_ = State::drained;
+        return status;
+    }
+    running.GoesOn();
+    state_ = State::on_row;
+    connection_.Join(*this);
+    return status;
+}
+
+Status SqliteQuery::CheckOpen() {
+    if (state_ == State::closed) return Error(errors::kFetchOutOfSequence);
+    return connection_.Stopping() ? Ended(SqliteConnection::Stopped()) : Status();
+}
+
+Status SqliteQuery::Ended(Status status) noexcept {
+    Close();
+    return status;
+}
+
+Status SqliteQuery::Fetch(RowSink& sink, std::uint32_t most, bool& more) {
+    more = false;
+    Status status = CheckOpen();
+    for (std::uint32_t row = 0; row < most && status.Ok(); ++row) {
+        bool found = false;
+        status = Next(found);
+        if (!status.Ok()) return Ended(std::move(status));
+        if (!found) {
+            if (!scrollable_) Close();
+            return status;
+        }
+        status = sink.Row(0, values_);
+    }
+    more = IsOpen();
+    return status;
+}
+
+// The next row as views, wherever it comes from.
+Status SqliteQuery::Next(bool& found) {
+    if (scrollable_ && next_ == store_.Size()) {
+        if (Status status = Keep(next_ + 1); !status.Ok()) return status;
+    }
+    if (scrollable_ || state_ == State::drained) {
+        found = next_ < store_.Size();
+        Status status = found ? store_.Read(next_, values_) : end_;
+        if (found && status.Ok()) ++next_;
+        return status;
+    }
+    if (state_ == State::stepping) {
+        bool has_row = false;
+        Status status = Step(has_row);
+        if (!has_row) return status;
+        state_ = State::on_row;
+    }
+    Fill();
+    state_ = State::stepping;
+    found = true;
     return {};
 }
 
-Status SqliteQuery::Open(RowSource& source, std::uint32_t row) {
-    Close();
-    // Outside a transaction an older query's rows would keep this one from seeing what others have committed since.
-    if (!read_only_ || (!connection_.InTransaction() && !connection_.Private())) connection_.ReadAhead(this);
-    Status status = BindRow(source, row, true);
-    bool has_row = false;
-    if (status.Ok()) status = Step(has_row);
-    if (!status.Ok() || !has_row) {
-        sqlite3_reset(statement_.get());
-        return status;
+// Steps to the next row and copies it into the store; drained behind the last one.
+Status SqliteQuery::KeepRow() {
+    if (state_ == State::stepping) {
+        bool has_row = false;
+        Status status = Step(has_row);
+        if (!has_row) {
+            if (status.Ok()) Drain({});
+            return status;
+        }
+        state_ = State::on_row;
     }
-    state_ = State::on_row;
-    connection_.Join(*this);
-    DescribeFromRow();
+    Fill();
+    Status status = store_.Add(values_);
+    if (status.Ok()) state_ = State::stepping;
     return status;
 }
 
-Status SqliteQuery::Fetch(std::span<Datum> values, bool& more) {
-    more = false;
-    if (state_ == State::stepping) {
-        const Status status = Step(more);
-        if (more) Fill(values);
-        else Close();
-        return status;
-    }
-    if (state_ == State::on_row) {
-        state_ = State::stepping;
-        more = true;
-        Fill(values);
-        return {};
-    }
-    if (state_ == State::closed) return {};
+// Reads on until the store has that many rows, or all.
+Status SqliteQuery::Keep(std::uint64_t rows) {
     Status status;
-    more = store_.Next(values, status);
-    if (more) return status;
-    if (status.Ok()) status = stored_end_;
-    Close();
+    while (status.Ok() && store_.Size() < rows && state_ != State::drained) status = KeepRow();
+    return status.Ok() && store_.Size() < rows ? end_ : status;
+}
+
+void SqliteQuery::Drain(Status end) noexcept {
+    sqlite3_reset(statement_.get());
+    connection_.Leave(*this);
+    end_ = std::move(end);
+    state_ = State::drained;
+}
+
+void SqliteQuery::ReadAhead() noexcept {
+    Status status;
+    try {
+        while (status.Ok() && state_ != State::drained) status = KeepRow();
+    } catch (const std::bad_alloc&) {
+        status = NoMemory();
+    }
+    if (state_ != State::drained) Drain(std::move(status));
+}
+
+Status SqliteQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
+    found = false;
+    Status status = CheckOpen();
+    if (!status.Ok()) return status;
+    if (!scrollable_) return Error(errors::kFetchOutOfSequence);
+    status = Keep(position);
+    if (!status.Ok()) return Ended(std::move(status));
+    next_ = std::min(position, store_.Size());
+    if (position == 0 || position > store_.Size()) return status;
+    status = store_.Read(position - 1, values_);
+    if (!status.Ok()) return Ended(std::move(status));
+    found = true;
+    return sink.Row(0, values_);
+}
+
+Status SqliteQuery::Count(std::uint64_t& rows) {
+    Status status = CheckOpen();
+    if (!status.Ok()) return status;
+    if (!scrollable_) return Error(errors::kFetchOutOfSequence);
+    status = Keep(std::numeric_limits<std::uint64_t>::max());
+    if (!status.Ok()) return Ended(std::move(status));
+    rows = store_.Size();
     return status;
 }
 
 void SqliteQuery::Close() noexcept {
     if (state_ == State::closed) return;
-    connection_.Leave(*this);
-    if (state_ == State::stored) store_.Clear();
-    else sqlite3_reset(statement_.get());
+    if (state_ != State::drained) Drain({});
+    sqlite3_clear_bindings(statement_.get());
+    store_.Clear();
     state_ = State::closed;
-    stored_end_ = {};
+    end_ = {};
+    next_ = 0;
 }
 
-void SqliteQuery::ReadAhead() {
-    if (state_ == State::closed || state_ == State::stored) return;
-    std::vector<Datum> values(columns_.size());
-    Status status;
-    bool has_row = state_ == State::on_row;
-    if (!has_row) status = Step(has_row);
-    while (has_row && status.Ok()) {
-        Fill(values);
-        status = store_.Add(values);
-        if (status.Ok()) status = Step(has_row);
-    }
-    stored_end_ = std::move(status);
-    sqlite3_reset(statement_.get());
-    connection_.Leave(*this);
-    state_ = State::stored;
-}
+// ---- Reading
 
-void SqliteQuery::Fill(std::span<Datum> values) {
+// The row that SQLite stands on, as views. Throws where SQLite found no memory for a value.
+void SqliteQuery::Fill() {
     sqlite3_stmt* statement = statement_.get();
-    for (std::size_t index = 0; index < values.size(); ++index) {
-        Datum& value = values[index];
+    for (std::size_t index = 0; index < values_.size(); ++index) {
+        Datum& value = values_[index];
         sqlite3_value* stored = sqlite3_column_value(statement, static_cast<int>(index));
         switch (sqlite3_value_type(stored)) {
             case SQLITE_INTEGER:
-                value.kind = readings_[index] == Reading::row_id ? Kind::row_id : Kind::integer;
+                value.kind = Kind::integer;
                 value.length = 0;
                 value.integer = sqlite3_value_int64(stored);
+                if (readings_[index] != Reading::row_id) break;
+                rooms_[index].row = RowIdOf(value.integer);
+                SetView(value, Kind::row_id, &rooms_[index].row, sizeof(RowId));
                 break;
             case SQLITE_FLOAT:
                 value.kind = Kind::real;
                 value.length = 0;
                 value.real = sqlite3_value_double(stored);
                 break;
-            case SQLITE_TEXT:
-                value.kind = readings_[index] == Reading::date ? Kind::timestamp : Kind::text;
-                // The bytes as they lie in the file: asking for a text would copy them to add a zero.
-                value.data = connection_.Utf8() ? sqlite3_value_blob(stored) : sqlite3_value_text(stored);
-                value.length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
-                if (readings_[index] == Reading::padded) Pad(index, value);
-                break;
-            case SQLITE_BLOB:
-                value.kind = Kind::bytes;
-                value.data = sqlite3_value_blob(stored);
-                value.length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
-                if (readings_[index] != Reading::bytes && ReadNumberBlob(value.Text(), numbers_[index])) {
-                    value.kind = Kind::decimal;
-                    value.data = &numbers_[index];
-                    value.length = sizeof numbers_[index];
-                }
-                break;
-            default:
-                value.kind = Kind::null;
-                value.length = 0;
-                value.integer = 0;
-                break;
+            case SQLITE_TEXT: FillText(index, stored, value); break;
+            case SQLITE_BLOB: FillBlob(index, stored, value); break;
+            default: value = {}; break;
         }
     }
+}
+
+// The bytes as they lie in the file: asking for a text would copy them to add a zero.
+void SqliteQuery::FillText(std::size_t column, sqlite3_value* stored, Datum& value) {
+    const void* data = connection_.Utf8() ? sqlite3_value_blob(stored) : sqlite3_value_text(stored);
+    SetView(value, Kind::text, data, static_cast<std::size_t>(sqlite3_value_bytes(stored)));
+    if (!data && (value.length > 0 || !connection_.Utf8())) throw std::bad_alloc();
+    if (readings_[column] == Reading::padded) return Pad(column, value);
+    if (readings_[column] != Reading::date) return;
+    date::DateTime& date = rooms_[column].date;
+    if (date::FromEngineText(value.Text(), &date) != 0 || date.month == 0) return;    // none, or a time alone
+    SetView(value, Kind::timestamp, &date, sizeof date);
+}
+
+void SqliteQuery::FillBlob(std::size_t column, sqlite3_value* stored, Datum& value) {
+    const void* data = sqlite3_value_blob(stored);
+    SetView(value, Kind::bytes, data, static_cast<std::size_t>(sqlite3_value_bytes(stored)));
+    if (!data && value.length > 0) throw std::bad_alloc();
+    OCINumber& number = rooms_[column].number;
+    if (readings_[column] == Reading::bytes || !ReadNumberBlob(value.Text(), number)) return;
+    SetView(value, Kind::decimal, &number, sizeof number);
 }
 
 // A fixed column's texts have its length, in characters or bytes.
@@ -275,10 +494,10 @@ void SqliteQuery::Pad(std::size_t column, Datum& value) {
     const std::size_t more = characters > 0 ? value.length - static_cast<std::size_t>(CharacterCount(value.Text())) : 0;
     const std::size_t size = (characters > 0 ? characters : columns_[column].size) + more;
     if (value.length >= size) return;
-    padded_[column].assign(value.Text());
-    padded_[column].resize(size, ' ');
-    value.data = padded_[column].data();
-    value.length = static_cast<std::uint32_t>(size);
+    std::string& padded = rooms_[column].padded;
+    padded.assign(value.Text());
+    padded.resize(size, ' ');
+    SetView(value, Kind::text, padded.data(), size);
 }
 
 }  // namespace engine::sqlite

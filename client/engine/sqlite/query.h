@@ -1,23 +1,24 @@
 // One compiled SQLite statement: array executions with borrowed values, and a query's rows as views.
 #pragma once
 
+#include <array>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "engine/engine.h"
+#include "engine/row_store.h"
 #include "engine/sqlite/coercion.h"
 #include "engine/sqlite/connection.h"
 #include "engine/sqlite/errors.h"
-#include "engine/sqlite/row_store.h"
 #include "oci.h"
 
 namespace engine::sqlite {
 
 class SqliteQuery final : public Query {
 public:
-    SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql);
+    SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql, Effect effect);
     // The placeholder's values are stored into the column, or compared with it.
     void UseFor(std::size_t parameter, const Column& column, Coercion::Purpose purpose);
     ~SqliteQuery() override;
@@ -25,15 +26,17 @@ public:
     SqliteQuery& operator=(const SqliteQuery&) = delete;
 
     const std::vector<Column>& Columns() override;
-    std::uint32_t PlaceholderCount() const override { return static_cast<std::uint32_t>(parameters_.size()); }
-    Status ExecuteArray(RowSource& source, std::uint32_t first, std::uint32_t last, bool all_rows,
-                        ArrayOutcome& outcome) override;
-    Status Open(RowSource& source, std::uint32_t row) override;
-    Status Fetch(std::span<Datum> values, bool& more) override;
+    Status ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) override;
+    Status Open(RowSource& source, const QueryRun& run) override;
+    [[nodiscard]] bool IsOpen() const override { return state_ != State::closed; }
+    Status Fetch(RowSink& sink, std::uint32_t most, bool& more) override;
+    Status Scroll(std::uint64_t position, RowSink& sink, bool& found) override;
+    Status Count(std::uint64_t& rows) override;
     void Close() noexcept override;
 
-    // Reads the rest of an open query's rows into memory and lets go of the database.
-    void ReadAhead();
+    // Reads the rest of an open query's rows into the store and lets go of the database. What fails is kept for the
+    // fetch that gets there.
+    void ReadAhead() noexcept;
 
 private:
     friend class SqliteConnection;
@@ -42,40 +45,71 @@ private:
         closed,
         on_row,      // stepped to a row that nobody has seen yet
         stepping,    // the next row is a step away
-        stored       // the rows to come are in store_
+        drained      // the rows to come are in store_, with end_ behind them
     };
     // How a value of a column is handed out.
     enum class Reading : std::uint8_t { as_stored, number, padded, date, row_id, bytes };
+    // Room for a column's value that SQLite keeps in another form.
+    struct Room {
+        OCINumber number;
+        date::DateTime date;
+        RowId row;
+        std::string padded;
+    };
+    using DateText = std::array<char, date::kMaxEngineText>;
 
     Status Bind(int index, const Datum& value, bool copy);
+    Status BindDate(int index, const date::DateTime& value, bool copy);
     Status BindRow(RowSource& source, std::uint32_t row, bool copy);
-    Status ExecuteRow(RowSource& source, std::uint32_t row, std::uint64_t& affected);
+    Status ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected);
+    Status TryRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) noexcept;
+    Status RunRow(std::uint32_t row, RowSink* returned);
     Status Step(bool& has_row);
-    Status Stopped(int code);
-    void Fill(std::span<Datum> values);
+    Status Start(RowSource& source, std::uint32_t row, bool& has_row);
+
+    Status CheckOpen();
+    Status Ended(Status status) noexcept;
+    Status Next(bool& found);
+    Status Keep(std::uint64_t rows);
+    Status KeepRow();
+    void Drain(Status end) noexcept;
+
+    void Fill();
+    void FillText(std::size_t column, sqlite3_value* stored, Datum& value);
+    void FillBlob(std::size_t column, sqlite3_value* stored, Datum& value);
     void Pad(std::size_t column, Datum& value);
+
     static Reading ReadingOf(const Column& column);
+    void Describe();
     void PlanReading();
     void DescribeFromRow();
+    [[nodiscard]] int Recompilations() const;
 
     SqliteConnection& connection_;
     StatementHandle statement_;
     std::string sql_;
     Verb verb_;
-    bool changes_rows_;
-    bool read_only_;
+    SqliteConnection::Entry entry_;
     State state_ = State::closed;
     std::vector<Datum> parameters_;
     std::vector<std::unique_ptr<Coercion>> coercions_;    // by parameter; null where nothing is to be done
+    std::vector<DateText> dates_;                         // by parameter; empty until a date is bound
+
+    bool described_ = false;
+    int described_at_ = 0;               // which compilation
     std::vector<Column> columns_;
     std::vector<bool> untyped_;          // columns whose type only a value tells
-    std::vector<Reading> readings_;      // one a column, once described
-    std::vector<OCINumber> numbers_;     // room for numbers read from blobs
-    std::vector<std::string> padded_;    // room for padded texts
-    RowStore store_;
-    Status stored_end_;                  // what comes after the stored rows
+    bool any_untyped_ = false;
+    std::vector<Reading> readings_;      // one a column, as rooms_ and values_ have
+    std::vector<Room> rooms_;
+    std::vector<Datum> values_;          // the row at hand
+
+    bool scrollable_ = false;
+    RowStore store_;                     // rows read ahead; of a scrollable query every row that was reached
+    std::uint64_t next_ = 0;             // the row of the store that comes next
+    Status end_;                         // what comes behind the last row
     SqliteQuery* previous_ = nullptr;    // on the connection's list of open queries
-    SqliteQuery* next_ = nullptr;
+    SqliteQuery* next_open_ = nullptr;
 };
 
 }  // namespace engine::sqlite

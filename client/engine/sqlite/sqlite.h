@@ -9,6 +9,6 @@
 namespace engine::sqlite {
 
 // Opens a database file, made when missing, or ":memory:".
-Status Connect(const std::string& file, std::unique_ptr<Connection>& connection);
+Status Open(const std::string& file, std::unique_ptr<Database>& database);
 
 }  // namespace engine::sqlite

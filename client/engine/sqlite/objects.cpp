@@ -1,0 +1,146 @@
+// Describing tables, views, schemas and the database itself. SQLite's schemas are main, temp and what is attached;
+// names are the same in either letter case and shown in upper case, as the names of columns are.
+#include <cctype>
+#include <filesystem>
+#include <initializer_list>
+#include <new>
+#include <string>
+#include <vector>
+
+#include "engine/sqlite/accounts.h"
+#include "engine/sqlite/connection.h"
+#include "engine/sqlite/describe.h"
+#include "engine/sqlite/pieces.h"
+#include "handles/errors.h"
+
+namespace engine::sqlite {
+namespace {
+
+std::string Upper(std::string_view text) {
+    std::string upper(text);
+    for (char& c : upper) c = static_cast<char>(c >= 'a' && c <= 'z' ? c - 'a' + 'A' : c);
+    return upper;
+}
+
+// In backquotes: a name in double quotes would count as one that the application wrote.
+std::string Quoted(std::string_view name) {
+    std::string quoted = "`";
+    for (const char c : name) quoted.append(c == '`' ? 2 : 1, c);
+    return quoted += '`';
+}
+
+// The texts of the first column.
+Status Texts(sqlite3* database, const std::string& sql, std::string_view bound, std::vector<std::string>& texts) {
+    sqlite3_stmt* compiled = nullptr;
+    int code = sqlite3_prepare_v2(database, sql.c_str(), static_cast<int>(sql.size()), &compiled, nullptr);
+    const StatementHandle statement(compiled);
+    if (code == SQLITE_OK && sqlite3_bind_parameter_count(compiled) > 0) {
+        code = sqlite3_bind_text(compiled, 1, bound.data(), static_cast<int>(bound.size()), SQLITE_STATIC);
+    }
+    if (code == SQLITE_OK) code = sqlite3_step(compiled);
+    for (; code == SQLITE_ROW; code = sqlite3_step(compiled)) {
+        const auto* text = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
+        if (!text) throw std::bad_alloc();
+        texts.emplace_back(text);
+    }
+    return code == SQLITE_DONE ? Status() : Failure(database, code);
+}
+
+// In the order in which SQLite looks for a name.
+Status Schemas(sqlite3* database, std::vector<std::string>& schemas) {
+    return Texts(database, "select name from pragma_database_list order by name <> 'temp', seq", {}, schemas);
+}
+
+struct Found {
+    std::string schema;
+    std::string type;    // "table", "view"; empty: there is none
+};
+
+Status Find(sqlite3* database, const std::string& schema, const std::string& name, Found& found) {
+    std::vector<std::string> schemas;
+    Status status = Schemas(database, schemas);
+    for (const std::string& candidate : schemas) {
+        if (status.Failed() || !found.type.empty()) break;
+        if (!schema.empty() && sqlite3_stricmp(schema.c_str(), candidate.c_str()) != 0) continue;
+        std::vector<std::string> types;
+        status = Texts(database, "select type from " + Quoted(candidate) + ".sqlite_schema where type in ('table', 'view')"
+                       " and name = ?1 collate nocase", name, types);
+        if (!types.empty()) found = {candidate, types.front()};
+    }
+    return status;
+}
+
+Status DescribeTable(sqlite3* database, const Found& found, const std::string& name, ObjectDescription& object) {
+    const std::string sql = "select * from " + Quoted(found.schema) + '.' + Quoted(name);
+    sqlite3_stmt* compiled = nullptr;
+    const int code = sqlite3_prepare_v2(database, sql.c_str(), static_cast<int>(sql.size()), &compiled, nullptr);
+    const StatementHandle statement(compiled);
+    if (code != SQLITE_OK) return Failure(database, code);
+    std::vector<bool> untyped;
+    DescribeColumns(database, compiled, sql, object.columns, untyped);
+    object.kind = found.type == "view" ? ObjectKind::view : ObjectKind::table;
+    object.schema = Upper(found.schema);
+    object.name = Upper(name);
+    return {};
+}
+
+Status DescribeSchema(sqlite3* database, const std::string& name, ObjectDescription& object) {
+    std::vector<std::string> schemas;
+    Status status = Schemas(database, schemas);
+    if (status.Failed()) return status;
+    for (const std::string& schema : schemas) {
+        if (sqlite3_stricmp(schema.c_str(), name.c_str()) != 0) continue;
+        status = Texts(database, "select upper(name) from " + Quoted(schema) + ".sqlite_schema where type in ('table', "
+                       "'view') and name not like 'sqlite\\_%' escape '\\' and name <> 'kelp_accounts' order by 1",
+                       {}, object.members);
+        object.kind = ObjectKind::schema;
+        object.name = Upper(schema);
+        return status;
+    }
+    return Error(errors::kNoSuchObject);
+}
+
+std::string DatabaseName(const SqliteConnection& connection) {
+    return Upper(connection.Private() ? "memory" : std::filesystem::path(connection.File()).stem().string());
+}
+
+Status DescribeDatabase(SqliteConnection& connection, const std::string& name, ObjectDescription& object) {
+    object.name = DatabaseName(connection);
+    if (Upper(name) != object.name) return Error(errors::kNoSuchObject);
+    object.kind = ObjectKind::database;
+    Status status = Schemas(connection.Database(), object.members);
+    for (std::string& schema : object.members) schema = Upper(schema);
+    return status;
+}
+
+}  // namespace
+
+Status SqliteConnection::Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) {
+    const Trusted trusted(*this);    // what the accounts' columns are is no secret
+    const bool wants_table = kind == ObjectKind::table || kind == ObjectKind::view;
+    const Status missing = Error(wants_table ? errors::kNoSuchTable : errors::kNoSuchObject);
+    ObjectDescription described;
+    Status status;
+    const std::vector<std::string_view> pieces = Split(name);
+    const bool qualified = pieces.size() == 3 && pieces[1] == ".";
+    if (pieces.size() != 1 && !qualified) return missing;
+    const std::string plain = PlainName(pieces.back());
+    if (kind == ObjectKind::schema || kind == ObjectKind::database) {
+        if (qualified) return missing;
+        status = kind == ObjectKind::schema ? DescribeSchema(Database(), plain, described)
+                                            : DescribeDatabase(*this, plain, described);
+    } else if (wants_table || kind == ObjectKind::any) {
+        Found found;
+        status = Find(Database(), qualified ? PlainName(pieces.front()) : std::string(), plain, found);
+        if (status.Failed()) return status;
+        if (found.type.empty()) return missing;
+        status = DescribeTable(Database(), found, plain, described);
+        if (kind != ObjectKind::any && described.kind != kind && status.Ok()) return missing;
+    } else {
+        return missing;    // neither sequences nor synonyms
+    }
+    if (status.Ok()) object = std::move(described);
+    return status;
+}
+
+}  // namespace engine::sqlite
