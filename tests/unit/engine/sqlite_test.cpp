@@ -1,165 +1,23 @@
-// The contract of the engine interface, on SQLite: values in and out, what array executions do, errors by number, open
-// queries beside writes, cancelling, accounts, broken databases.
-#include <gtest/gtest.h>
+// What is the SQLite engine's own: numbers and declared types in a file, descriptions, SQL functions, errors by number,
+// the accounts' table, files that cannot be written, databases in memory.
 #include <sqlite3.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
-#include <atomic>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
 #include <fstream>
 #include <functional>
 #include <thread>
 
-#include "engine/engine.h"
-#include "number/number.h"
-#include "oci.h"
+#include "engine/engine_fixture.h"
 
 namespace {
 
 namespace fs = std::filesystem;
-using engine::Datum;
-using engine::Kind;
 
-Datum Null() { return {}; }
-Datum Integer(std::int64_t value) {
-    Datum datum;
-    datum.kind = Kind::integer;
-    datum.integer = value;
-    return datum;
-}
-Datum Bytes(Kind kind, std::string_view bytes) {
-    Datum datum;
-    datum.kind = kind;
-    datum.length = static_cast<std::uint32_t>(bytes.size());
-    datum.data = bytes.data();
-    return datum;
-}
-Datum Text(std::string_view text) { return Bytes(Kind::text, text); }
-Datum Decimal(const OCINumber& number) {
-    return Bytes(Kind::decimal, {reinterpret_cast<const char*>(&number), sizeof number});
-}
+class Sqlite : public EngineFixture {};
 
-// Rows held as they are; a row may refuse.
-struct Rows : engine::RowSource {
-    std::vector<std::vector<Datum>> rows;
-    int refused_row = -1;
-    Rows(std::initializer_list<std::vector<Datum>> given) : rows(given) {}
-    Status Row(std::uint32_t row, std::span<Datum> values) override {
-        if (static_cast<int>(row) == refused_row) return Error(1722);
-        std::copy(rows.at(row).begin(), rows.at(row).end(), values.begin());
-        return {};
-    }
-};
-
-std::string Shown(const Datum& value) {
-    switch (value.kind) {
-        case Kind::null: return "null";
-        case Kind::integer: return std::to_string(value.integer);
-        case Kind::row_id: return "row " + std::to_string(value.integer);
-        case Kind::real: {
-            char text[40];
-            std::snprintf(text, sizeof text, "real %.15g", value.real);
-            return text;
-        }
-        case Kind::decimal: {
-            char text[number::kMaxPlainText];
-            std::size_t length = 0;
-            number::ToPlainText(*static_cast<const OCINumber*>(value.data), '.', text, &length);
-            return "decimal " + std::string(text, length);
-        }
-        case Kind::bytes: return "bytes " + std::to_string(value.length);
-        case Kind::timestamp: return "time " + std::string(value.Text());
-        default: return std::string(value.Text());
-    }
-}
-
-class EngineTest : public testing::Test {
-protected:
-    void SetUp() override {
-        char name[] = "/tmp/kelp-engine-XXXXXX";
-        folder_ = mkdtemp(name);
-        connection_ = Open();
-    }
-    void TearDown() override {
-        connection_.reset();
-        fs::permissions(folder_, fs::perms::owner_all);
-        fs::remove_all(folder_);
-    }
-
-    std::string File() const { return folder_ + "/test.db"; }
-    std::unique_ptr<engine::Connection> Open() { return Open(File()); }
-    static std::unique_ptr<engine::Connection> Open(const std::string& file) {
-        std::unique_ptr<engine::Connection> connection;
-        const Status status = engine::Connect(file, connection);
-        EXPECT_TRUE(status.Ok()) << status.Number() << ' ' << status.Detail();
-        return connection;
-    }
-    std::unique_ptr<engine::Query> Prepare(const std::string& sql) { return Prepare(*connection_, sql); }
-    static std::unique_ptr<engine::Query> Prepare(engine::Connection& connection, const std::string& sql) {
-        std::unique_ptr<engine::Query> query;
-        std::uint32_t offset = 0;
-        const Status status = connection.Prepare(sql, query, offset);
-        EXPECT_TRUE(status.Ok()) << sql << ": " << status.Number() << ' ' << status.Detail();
-        return query;
-    }
-    // Runs a statement without placeholders once; answers the number of its error, 0 for none.
-    int Run(const std::string& sql) { return Run(*connection_, sql); }
-    static int Run(engine::Connection& connection, const std::string& sql) {
-        std::unique_ptr<engine::Query> query;
-        std::uint32_t offset = 0;
-        Status status = connection.Prepare(sql, query, offset);
-        if (status.Failed()) return status.Number();
-        engine::ArrayOutcome outcome;
-        Rows none{{}};
-        status = query->ExecuteArray(none, 0, 1, false, outcome);
-        if (status.Failed()) return status.Number();
-        return outcome.failures.empty() ? 0 : outcome.failures.front().status.Number();
-    }
-    std::string Query(const std::string& sql, std::vector<Datum> values = {}) {
-        return Query(*connection_, sql, values);
-    }
-    // All rows: columns with ',', rows with ';' behind them.
-    static std::string Query(engine::Connection& connection, const std::string& sql, std::vector<Datum> values = {}) {
-        auto query = Prepare(connection, sql);
-        if (!query) return "not prepared";
-        Rows source{values};
-        const Status status = query->Open(source, 0);
-        return status.Ok() ? Rest(*query) : "error " + std::to_string(status.Number());
-    }
-    static std::string Rest(engine::Query& query) {
-        std::string text;
-        std::vector<Datum> values(query.Columns().size());
-        bool more = true;
-        for (;;) {
-            const Status status = query.Fetch(values, more);
-            if (status.Failed()) return text + "error " + std::to_string(status.Number());
-            if (!more) return text;
-            for (std::size_t index = 0; index < values.size(); ++index)
-                text += (index ? "," : "") + Shown(values[index]);
-            text += ';';
-        }
-    }
-    static bool Step(engine::Query& query) {
-        std::vector<Datum> values(query.Columns().size());
-        bool more = false;
-        EXPECT_TRUE(query.Fetch(values, more).Ok());
-        return more;
-    }
-
-    std::string folder_;
-    std::unique_ptr<engine::Connection> connection_;
-};
-
-OCINumber Number(const char* text) {
-    OCINumber number;
-    EXPECT_EQ(number::FromPlainText(text, '.', &number), 0) << text;
-    return number;
-}
-
-TEST_F(EngineTest, NumbersKeepEveryDigit) {
+TEST_F(Sqlite, NumbersKeepEveryDigit) {
     ASSERT_EQ(Run("create table t(n number)"), 0);
     const struct { const char* text; const char* stored; } cases[] = {
         {"0", "0"}, {"-1", "-1"}, {"123.45", "real 123.45"}, {"9223372036854775807", "9223372036854775807"},
@@ -170,32 +28,30 @@ TEST_F(EngineTest, NumbersKeepEveryDigit) {
     for (const auto& c : cases) {
         ASSERT_EQ(Run("delete from t"), 0);
         const OCINumber number = Number(c.text);
-        Rows rows{{Decimal(number)}};
-        engine::ArrayOutcome outcome;
-        ASSERT_TRUE(Prepare("insert into t values(?1)")->ExecuteArray(rows, 0, 1, false, outcome).Ok());
+        ASSERT_EQ(Run("insert into t values(?1)", {Decimal(number)}), 0);
         EXPECT_EQ(Query("select n from t"), std::string(c.stored) + ';') << c.text;
         EXPECT_EQ(Query("select count(*) from t where n = ?1", {Decimal(number)}), "1;") << c.text;
         EXPECT_EQ(Query("select max(n) from t"), std::string(c.stored) + ';') << "without a declaration: " << c.text;
     }
 }
 
-TEST_F(EngineTest, LongLiteralsKeepEveryDigit) {
+TEST_F(Sqlite, LongLiteralsKeepEveryDigit) {
     ASSERT_EQ(Run("create table t(n number)"), 0);
     ASSERT_EQ(Run("insert into t values(-123456789012345678901234567890.5), (1), (12345678901234567890)"), 0);
     EXPECT_EQ(Query("select n from t"), "decimal -123456789012345678901234567890.5;1;decimal 12345678901234567890;");
 }
 
-TEST_F(EngineTest, ValuesComeBackAsTheirColumnsAreDeclared) {
+TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
     ASSERT_EQ(Run("create table t(c char(4), v varchar2(10), d date, r raw(4), b blob, i integer)"), 0);
-    Rows rows{{Text("ab"), Text("ab"), Text("2024-02-29 12:00:00"), Bytes(Kind::bytes, "xy"), Null(), Integer(7)}};
-    engine::ArrayOutcome outcome;
-    ASSERT_TRUE(Prepare("insert into t values(?1, ?2, ?3, ?4, ?5, ?6)")->ExecuteArray(rows, 0, 1, false, outcome).Ok());
+    const date::DateTime noon{.year = 2024, .month = 2, .day = 29, .hour = 12};
+    ASSERT_EQ(Run("insert into t values(?1, ?2, ?3, ?4, ?5, ?6)",
+                  {Text("ab"), Text("ab"), Moment(noon), View(Kind::bytes, "xy"), Null(), Integer(7)}), 0);
     EXPECT_EQ(Query("select * from t"), "ab  ,ab,time 2024-02-29 12:00:00,bytes 2,null,7;");
-    EXPECT_EQ(Query("select t.rowid, count(*) from t"), "row 1,1;");
+    EXPECT_EQ(Query("select t.rowid, count(*) from t"), "row 00000000000000000001,1;");
 }
 
 // The same value through a placeholder, as a literal, from a query and by an update.
-TEST_F(EngineTest, ColumnsTakeWhatTheirDeclarationSays) {
+TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
     ASSERT_EQ(
         Run("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
             "s timestamp, r raw(2), x kelp_decfloat(16), b clob)"),
@@ -258,17 +114,15 @@ TEST_F(EngineTest, ColumnsTakeWhatTheirDeclarationSays) {
             << "update " << literal;
         if (literal.front() != '\'') continue;
         fresh("select 1");
-        Rows rows{{Text(std::string_view(literal).substr(1, literal.size() - 2))}};
-        engine::ArrayOutcome bound;
-        ASSERT_TRUE(Prepare("insert into t(" + column + ") values(?1)")->ExecuteArray(rows, 0, 1, false, bound).Ok());
-        EXPECT_EQ(outcome(bound.failures.empty() ? 0 : bound.failures[0].status.Number()), want) << "bound " << literal;
+        const Datum bound = Text(std::string_view(literal).substr(1, literal.size() - 2));
+        EXPECT_EQ(outcome(Run("insert into t(" + column + ") values(?1)", {bound})), want) << "bound " << literal;
     }
 }
 
-TEST_F(EngineTest, ColumnsAreDescribed) {
+TEST_F(Sqlite, ColumnsAreDescribed) {
     ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR (5), d timestamp_tz(3), "
                   "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5))"), 0);
-    const auto query = Prepare("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
+    const auto query = Prepared("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
                                "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', count(kelp_date(b )) from t");
     struct Expected { const char* name; int type; unsigned size; int precision; int scale; bool nullable; };
     const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false},
@@ -299,7 +153,7 @@ TEST_F(EngineTest, ColumnsAreDescribed) {
     }
 }
 
-TEST_F(EngineTest, CastsKeepDigitsAndDates) {
+TEST_F(Sqlite, CastsKeepDigitsAndDates) {
     const OCINumber pi = Number("3.141592653589793238462643383279502884");
     const struct { const char* sql; const char* rows; } cases[] = {
         {"values(kelp_varchar(kelp_decfloat(?1, 34), 100))", "3.141592653589793238462643383279503;"},
@@ -313,7 +167,7 @@ TEST_F(EngineTest, CastsKeepDigitsAndDates) {
     for (const auto& c : cases) EXPECT_EQ(Query(c.sql, {Decimal(pi)}), c.rows) << c.sql;
 }
 
-TEST_F(EngineTest, FunctionsOfDatesNumbersAndText) {
+TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
     const struct { const char* list; const char* row; } cases[] = {
         {"to_char('2024-02-09 13:14:15'), to_char('2024-02-09 13:14:15', 'YYYY/MM/DD HH24:MI')",
          "09-FEB-24,2024/02/09 13:14;"},
@@ -361,8 +215,8 @@ TEST_F(EngineTest, FunctionsOfDatesNumbersAndText) {
     for (const auto& c : cases) EXPECT_EQ(Query(std::string("select ") + c.list), c.row) << c.list;
 }
 
-TEST_F(EngineTest, CallsAreDescribedBeforeTheyRun) {
-    const auto query = Prepare("select to_date(null), trunc(last_day(null)), to_number(null), hextoraw(null),"
+TEST_F(Sqlite, CallsAreDescribedBeforeTheyRun) {
+    const auto query = Prepared("select to_date(null), trunc(last_day(null)), to_number(null), hextoraw(null),"
                                " nvl(add_months(null, 1), 2), decode(1, 2, months_between(null, 1)) as m");
     const struct { const char* name; int type; } columns[] = {
         {"TO_DATE(NULL)", SQLT_DAT}, {"TRUNC(LAST_DAY(NULL))", SQLT_DAT}, {"TO_NUMBER(NULL)", SQLT_NUM},
@@ -374,32 +228,7 @@ TEST_F(EngineTest, CallsAreDescribedBeforeTheyRun) {
     }
 }
 
-TEST_F(EngineTest, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
-    ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
-    const auto insert = Prepare("insert into t values(?1)");
-    Rows rows{{Integer(1)}, {Integer(1)}, {Integer(2)}, {Integer(2)}, {Integer(3)}};
-    engine::ArrayOutcome stopped;
-    ASSERT_TRUE(connection_->Begin().Ok());
-    ASSERT_TRUE(insert->ExecuteArray(rows, 0, 5, false, stopped).Ok());
-    EXPECT_EQ(stopped.executed, 1u);
-    ASSERT_EQ(stopped.failures.size(), 1u);
-    EXPECT_EQ(stopped.failures[0].row, 1u);
-    EXPECT_EQ(stopped.failures[0].status.Number(), 1);
-    EXPECT_EQ(Query("select n from t"), "1;") << "the row before the failure stays";
-
-    rows.refused_row = 4;
-    engine::ArrayOutcome all;
-    ASSERT_TRUE(insert->ExecuteArray(rows, 1, 5, true, all).Ok());
-    EXPECT_EQ(all.executed, 1u);
-    EXPECT_EQ(all.affected, 1u);
-    ASSERT_EQ(all.failures.size(), 3u);
-    EXPECT_EQ(all.failures[2].row, 4u);
-    EXPECT_EQ(all.failures[2].status.Number(), 1722) << "what the source refuses";
-    ASSERT_TRUE(connection_->Rollback().Ok());
-    EXPECT_EQ(Query("select count(*) from t"), "0;");
-}
-
-TEST_F(EngineTest, ErrorsHaveTheirNumbers) {
+TEST_F(Sqlite, ErrorsHaveTheirNumbers) {
     ASSERT_EQ(Run("create table p(id integer primary key, n number not null, u varchar2(9) unique, check (n < 100))"),
               0);
     ASSERT_EQ(Run("create table c(p integer references p(id))"), 0);
@@ -419,14 +248,13 @@ TEST_F(EngineTest, ErrorsHaveTheirNumbers) {
         {"rollback to nowhere", 1086}};
     for (const auto& c : cases) EXPECT_EQ(Run(c.sql), c.number) << c.sql;
 
-    ASSERT_TRUE(connection_->Begin().Ok());
     ASSERT_EQ(Run("insert into late values(77)"), 0);
     EXPECT_EQ(connection_->Commit().Number(), 2091) << "a deferred constraint undoes the transaction";
     EXPECT_FALSE(connection_->InTransaction());
 }
 
 // Each condition with its text as a literal and through a placeholder.
-TEST_F(EngineTest, ComparisonsReadValuesAsTheirColumns) {
+TEST_F(Sqlite, ComparisonsReadValuesAsTheirColumns) {
     ASSERT_EQ(Run("create table t(id integer, d date, c char(5), n number, r raw(2), v varchar2(9))"), 0);
     ASSERT_EQ(Run("create table u(id integer, e timestamp, v number)"), 0);
     ASSERT_EQ(Run("insert into t values(1, '03-FEB-24', 'ab', 5, '0A', 'x ')"), 0);
@@ -455,140 +283,163 @@ TEST_F(EngineTest, ComparisonsReadValuesAsTheirColumns) {
     EXPECT_EQ(Query("select t.id from t join u on t.id = u.id where t.v = 'x '"), "1;") << "two columns, two types";
 }
 
-TEST_F(EngineTest, RefusedValueNamesItsColumn) {
+TEST_F(Sqlite, RefusedValueNamesItsColumn) {
     ASSERT_EQ(Run("create table t(v varchar2(3))"), 0);
     Rows rows{{Text("long")}};
     for (const char* sql : {"insert into t values(?1)", "insert into t values('lo' || substr(?1, 3))"}) {
         engine::ArrayOutcome outcome;
-        ASSERT_TRUE(Prepare(sql)->ExecuteArray(rows, 0, 1, false, outcome).Ok());
+        ASSERT_TRUE(Prepared(sql)->ExecuteArray(rows, {}, outcome).Ok());
         ASSERT_EQ(outcome.failures.size(), 1u) << sql;
         EXPECT_EQ(outcome.failures[0].status.Number(), 12899);
         EXPECT_EQ(outcome.failures[0].status.Detail(), "column V, actual 4, maximum 3") << sql;
     }
 }
 
-TEST_F(EngineTest, SyntaxErrorTellsItsPlace) {
+
+TEST_F(Sqlite, FailedCompilationTellsWhoSaysSo) {
     std::unique_ptr<engine::Query> query;
     std::uint32_t offset = 0;
-    const Status status = connection_->Prepare("select 1 frm t", query, offset);
+    const Status status = connection_->Compile({"select 1 frm t", Effect::reads, {}}, query, offset);
     EXPECT_EQ(status.Number(), 900);
     EXPECT_EQ(offset, 13u);
     EXPECT_STREQ(status.Engine(), "SQLITE");
-    EXPECT_FALSE(query);
 }
 
-TEST_F(EngineTest, OpenQueryNeitherHindersNorSeesAnotherSessionsCommit) {
-    ASSERT_EQ(Run("create table t(n integer)"), 0);
-    ASSERT_EQ(Run("insert into t values(1), (2), (3)"), 0);
-    const auto other = Open();
-    Rows none{{}};
-    const auto open = Prepare("select n from t");
-    ASSERT_TRUE(open->Open(none, 0).Ok());
-    ASSERT_TRUE(Step(*open));
-    EXPECT_EQ(Run(*other, "insert into t values(4)"), 0);
-
-    EXPECT_EQ(Query("select count(*) from t"), "4;") << "a query begun later sees it";
-    ASSERT_TRUE(connection_->Begin().Ok()) << "a write after a stale read";
-    EXPECT_EQ(Run("update t set n = n + 10"), 0);
-    EXPECT_EQ(Rest(*open), "2;3;") << "the open query shows what it was opened on";
-    ASSERT_TRUE(connection_->Rollback().Ok());
+// Texts in UTF-16 come and go as UTF-8, empty ones too.
+TEST_F(Sqlite, FilesInUtf16AreReadAsAnyOther) {
+    connection_.reset();
+    database_.reset();
+    sqlite3* file = nullptr;
+    const std::string name = folder_ + "/wide.db";
+    ASSERT_EQ(sqlite3_open(name.c_str(), &file), SQLITE_OK);
+    ASSERT_EQ(sqlite3_exec(file, "pragma encoding = 'UTF-16le'; create table t(v varchar2(9), d date, c char(3));"
+                                 "insert into t values('ä€', '2024-02-29 00:00:00', 'é'), ('', null, '')",
+                           nullptr, nullptr, nullptr), SQLITE_OK);
+    sqlite3_close(file);
+    ASSERT_TRUE(engine::Open(name, database_).Ok());
+    connection_ = Connect();
+    EXPECT_EQ(Query("select v, d, c from t"), "ä€,time 2024-02-29 00:00:00,é ;,null,   ;");
 }
 
-TEST_F(EngineTest, QueryIsDescribedAnewWhenItsTableHasChanged) {
-    ASSERT_EQ(Run("create table t(a integer)"), 0);
-    ASSERT_EQ(Run("insert into t values(1)"), 0);
-    const auto query = Prepare("select * from t");
-    Rows none{{}};
-    ASSERT_TRUE(query->Open(none, 0).Ok());
-    EXPECT_EQ(Rest(*query), "1;");
-    ASSERT_EQ(Run("alter table t add b char(3)"), 0);
-    ASSERT_EQ(Run("update t set b = 'x'"), 0);
-    ASSERT_TRUE(query->Open(none, 0).Ok());
-    EXPECT_EQ(Rest(*query), "1,x  ;");
+TEST_F(Sqlite, TextThatIsNoDateStaysAText) {
+    ASSERT_EQ(Run("create table t(d date, s timestamp with time zone)"), 0);
+    connection_.reset();
+    sqlite3* file = nullptr;
+    ASSERT_EQ(sqlite3_open((folder_ + "/test.db").c_str(), &file), SQLITE_OK);
+    ASSERT_EQ(sqlite3_exec(file, "insert into t values('soon', '12:30:00'), (5, '2024-02-29 01:02:03.5 +01:00')", nullptr,
+                           nullptr, nullptr), SQLITE_OK);
+    sqlite3_close(file);
+    connection_ = Connect();
+    EXPECT_EQ(Query("select d, s from t"), "soon,12:30:00;5,time 2024-02-29 01:02:03.5 +01:00;");
 }
 
-TEST_F(EngineTest, OpenQueryOutlivesWritesDropsAndRollbackOfItsOwnSession) {
+// 48 MB: more than stays in memory.
+TEST_F(Sqlite, OpenQueryOutlivesItsTablesInATemporaryFile) {
     ASSERT_EQ(Run("create table t(n integer, v varchar2(2000))"), 0);
     ASSERT_EQ(Run("with recursive r(n) as (select 1 union all select n + 1 from r where n < 40000) "
-                  "insert into t select n, hex(zeroblob(600)) from r"), 0);    // 48 MB: more than stays in memory
-    Rows none{{}};
-    const auto open = Prepare("select n, v from t order by n");
-    ASSERT_TRUE(open->Open(none, 0).Ok());
-    ASSERT_TRUE(Step(*open));
+                  "insert into t select n, hex(zeroblob(600)) from r"), 0);
+    struct : engine::RowSink {
+        std::int64_t row = 0;
+        Status Row(std::uint32_t, std::span<const Datum> values) override {
+            const bool is_right = values[0].integer == ++row && values[1].length == 1200 &&
+                                  values[1].Text().find_first_not_of('0') == std::string_view::npos;
+            return is_right ? Status() : Error(600);
+        }
+    } sink;
+    const auto open = Opened("select n, v from t order by n");
+    bool more = false;
+    ASSERT_EQ(Answer(open->Fetch(sink, 1, more)), 0);
     ASSERT_EQ(Run("drop table t"), 0);
-    std::vector<Datum> values(2);
-    bool more = true;
-    for (std::int64_t row = 2; row <= 40000; ++row) {
-        ASSERT_TRUE(open->Fetch(values, more).Ok() && more) << row;
-        ASSERT_EQ(values[0].integer, row);
-        ASSERT_EQ(values[1].length, 1200u);
-        ASSERT_EQ(values[1].Text().find_first_not_of('0'), std::string_view::npos) << row;
-    }
-    ASSERT_TRUE(open->Fetch(values, more).Ok());
+    ASSERT_EQ(Answer(open->Fetch(sink, 100000, more)), 0) << "row " << sink.row;
+    EXPECT_EQ(sink.row, 40000);
     EXPECT_FALSE(more);
 }
 
-TEST_F(EngineTest, LockedDatabaseAnswersAfterAWhile) {
+TEST_F(Sqlite, AccountsAreNobodysBusiness) {
+    EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "other")), 1017) << "no accounts";
+    EXPECT_EQ(Run("create table KELP_accounts(name, password)"), 1031) << "nobody but the engine makes it";
+    EXPECT_EQ(Run("create temp view kelp_accounts as select 'ANN' as name, '' as password"), 1031);
+    ASSERT_EQ(LogOn("ann", "secret"), 0);
     ASSERT_EQ(Run("create table t(n integer)"), 0);
-    const auto other = Open();
-    ASSERT_TRUE(other->Begin().Ok());
-    EXPECT_EQ(connection_->Begin().Number(), 54);
-    EXPECT_EQ(Query("select count(*) from t"), "0;") << "readers go on";
-    ASSERT_TRUE(other->Rollback().Ok());
-    EXPECT_TRUE(connection_->Begin().Ok());
+    EXPECT_EQ(Query("select name from kelp_accounts"), "ANN;");
+    for (const char* sql :
+         {"update kelp_accounts set password = ''", "delete from kelp_accounts", "delete from Main.KELP_Accounts",
+          "insert into kelp_accounts values('BOB', '', '')", "drop table kelp_accounts",
+          "alter table kelp_accounts rename to x", "alter table kelp_accounts add y", "create index i on kelp_accounts(name)",
+          "create trigger g after insert on kelp_accounts begin select 1; end", "select password from kelp_accounts",
+          "select * from kelp_accounts", "select count(*) from kelp_accounts where password like '$y$%'",
+          "insert into t select n from t returning (select max(password) from kelp_accounts)"}) {
+        EXPECT_EQ(Run(sql), 1031) << sql;
+    }
+    ASSERT_EQ(Run("create trigger g after insert on t begin delete from kelp_accounts; end"), 0);
+    EXPECT_EQ(Run("insert into t values(1)"), 1031) << "through a trigger";
+    ASSERT_EQ(Run("create view w as select * from kelp_accounts"), 0);
+    EXPECT_EQ(Run("select * from w"), 1031) << "through a view";
+    EXPECT_EQ(Run("attach '" + folder_ + "/test.db' as again"), 0);
+    EXPECT_EQ(Run("delete from again.kelp_accounts"), 1031);
+    EXPECT_EQ(Run("pragma writable_schema = on"), 0);
+    EXPECT_NE(Run("delete from sqlite_schema"), 0) << "the schema is no table";
+    engine::ObjectDescription object;
+    EXPECT_EQ(Answer(connection_->Describe("kelp_accounts", engine::ObjectKind::table, object)), 0);
+
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(LogOn("ann", "secret"), 0);
+    sqlite3* file = nullptr;
+    std::string hash;
+    ASSERT_EQ(sqlite3_open((folder_ + "/test.db").c_str(), &file), SQLITE_OK);
+    const auto take = [](void* text, int, char** values, char**) { *static_cast<std::string*>(text) = values[0]; return 0; };
+    sqlite3_exec(file, "select password from kelp_accounts", take, &hash, nullptr);
+    sqlite3_close(file);
+    EXPECT_EQ(hash.substr(0, 3), "$y$");
 }
 
-TEST_F(EngineTest, CancelStopsTheRunningCallOrTheNextOne) {
-    const char* endless = "with recursive r(n) as (select 1 union all select n + 1 from r) select max(n) from r";
-    std::thread breaker([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(50));
-        connection_->Cancel();
-    });
-    EXPECT_EQ(Query(endless), "error 1013");
-    breaker.join();
-    EXPECT_EQ(Query("select 1"), "1;");
-    connection_->Cancel();
-    EXPECT_EQ(Query("select 1"), "error 1013");
-
-    const auto other = Open();
-    ASSERT_TRUE(other->Begin().Ok());
-    std::thread waiter([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(50));
-        connection_->Cancel();
-    });
-    EXPECT_EQ(connection_->Begin().Number(), 1013) << "while it waits for a lock";
-    waiter.join();
-    connection_->Cancel();
-    connection_->ForgetCancel();
-    EXPECT_EQ(Query("select 1"), "1;");
+// The tables of a database in memory stay for the next session, what was the former one's alone does not.
+TEST_F(Sqlite, SessionsOfADatabaseInMemoryShareItsTablesAlone) {
+    connection_.reset();
+    ASSERT_TRUE(engine::Open(":memory:", database_).Ok());
+    connection_ = Connect();
+    ASSERT_EQ(Run("create table kept(n integer primary key, p integer references kept(n))"), 0);
+    ASSERT_EQ(Run("create temp table mine(n integer)"), 0);
+    ASSERT_EQ(Run("create temp view seen as select * from kept"), 0);
+    ASSERT_EQ(Run("create temp trigger g after insert on kept begin delete from kept; end"), 0);
+    ASSERT_EQ(Run("attach '" + folder_ + "/test.db' as other"), 0);
+    EXPECT_EQ(Query("pragma query_only = 1"), "");
+    EXPECT_EQ(Query("pragma foreign_keys = 0"), "");
+    connection_.reset();
+    connection_ = Connect();
+    EXPECT_EQ(Run("insert into kept values(1, 2)"), 2291) << "references are checked again";
+    EXPECT_EQ(Run("insert into kept values(1, 1)"), 0);
+    EXPECT_EQ(Query("select n from kept"), "1;") << "no trigger of the former session's";
+    EXPECT_EQ(Query("select * from mine"), "error 942");
+    EXPECT_EQ(Query("select * from seen"), "error 942");
+    EXPECT_EQ(Query("select name from pragma_database_list where name <> 'temp'"), "main;");
+    connection_.reset();
+    connection_ = Connect();
+    EXPECT_EQ(Query("select * from kept"), "") << "rolled back at the end";
 }
 
-TEST_F(EngineTest, FirstNamedLogonOwnsTheDatabase) {
-    EXPECT_TRUE(connection_->Authenticate({"", "", true}).Ok()) << "no accounts: anybody of the system";
-    EXPECT_EQ(connection_->ChangePassword("ann", "secret", "other").Number(), 1017) << "no accounts";
-    EXPECT_TRUE(connection_->Authenticate({"ann", "secret", false}).Ok());
-    const auto other = Open();
-    EXPECT_TRUE(other->Authenticate({"ANN", "secret", false}).Ok());
-    EXPECT_EQ(other->Authenticate({"ann", "Secret", false}).Number(), 1017);
-    EXPECT_EQ(other->Authenticate({"ann", std::string("secret\0x", 8), false}).Number(), 1017);
-    EXPECT_EQ(other->Authenticate({"bob", "secret", false}).Number(), 1017);
-    EXPECT_TRUE(other->Authenticate({"", "", true}).Ok()) << "the owner of the file";
-    EXPECT_EQ(other->ChangePassword("ann", "wrong", "new").Number(), 28008);
-    EXPECT_TRUE(other->ChangePassword("ann", "secret", "new").Ok());
-    EXPECT_EQ(connection_->Authenticate({"ann", "secret", false}).Number(), 1017);
-    EXPECT_TRUE(connection_->Authenticate({"ann", "new", false}).Ok());
-    EXPECT_EQ(Query("select substr(password, 1, 3) from kelp_accounts"), "$y$;");
+TEST_F(Sqlite, SchemasAndTheDatabaseAreDescribed) {
+    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    ASSERT_EQ(Run("create temp table t(v varchar2(3))"), 0);
+    engine::ObjectDescription object;
+    ASSERT_EQ(Answer(connection_->Describe("t", engine::ObjectKind::any, object)), 0);
+    EXPECT_EQ(object.schema, "TEMP") << "as SQLite looks for a name";
+    ASSERT_EQ(Answer(connection_->Describe("main.t", engine::ObjectKind::any, object)), 0);
+    EXPECT_EQ(object.columns[0].name, "N");
+    ASSERT_EQ(Answer(connection_->Describe("TEST", engine::ObjectKind::database, object)), 0);
+    EXPECT_EQ(object.members, (std::vector<std::string>{"TEMP", "MAIN"}));
 }
 
-TEST_F(EngineTest, BrokenDatabasesHaveTheirNumbers) {
+TEST_F(Sqlite, BrokenDatabasesHaveTheirNumbers) {
     ASSERT_EQ(Run("create table t(n integer, v text)"), 0);
     ASSERT_EQ(Run("insert into t values(1, 'kept')"), 0);
-    std::unique_ptr<engine::Connection> none;
-    EXPECT_EQ(engine::Connect(folder_ + "/no/such/folder/x.db", none).Number(), 12154);
-    EXPECT_EQ(engine::Connect("postgresql://localhost/x", none).Number(), 21520);
-    EXPECT_EQ(engine::Connect(folder_ + "/", none).Number(), 12154);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    std::unique_ptr<engine::Database> none;
+    EXPECT_EQ(Answer(engine::Open(folder_ + "/no/such/folder/x.db", none)), 12154);
+    EXPECT_EQ(Answer(engine::Open("postgresql://localhost/x", none)), 21520);
+    EXPECT_EQ(Answer(engine::Open(folder_ + "/", none)), 12154);
     std::ofstream(folder_ + "/text.db") << std::string(5000, 'x');
-    EXPECT_EQ(engine::Connect(folder_ + "/text.db", none).Number(), 1210);
+    EXPECT_EQ(Answer(engine::Open(folder_ + "/text.db", none)), 1210);
     EXPECT_FALSE(none);
 
     EXPECT_EQ(Query("pragma max_page_count = 10"), "10;");
@@ -597,6 +448,85 @@ TEST_F(EngineTest, BrokenDatabasesHaveTheirNumbers) {
 
     EXPECT_EQ(Query("pragma query_only = 1"), "");
     EXPECT_EQ(Run("insert into t values(3, 'x')"), 16000) << "read-only";
+}
+
+// Runs an action in a process of a user who may write nothing here; answers what it counted.
+int AsNobody(const std::function<int()>& action) {
+    const pid_t child = fork();
+    if (child == 0) {
+        constexpr uid_t kNobody = 65534;
+        if (geteuid() == 0 && (setgid(kNobody) != 0 || setuid(kNobody) != 0)) _exit(99);
+        _exit(action());
+    }
+    int status = 0;
+    waitpid(child, &status, 0);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+TEST_F(Sqlite, FileThatCannotBeWrittenIsRead) {
+    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    ASSERT_EQ(Run("insert into t values(1)"), 0);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    connection_.reset();
+    database_.reset();
+    const std::string file = folder_ + "/test.db";
+    ASSERT_FALSE(fs::exists(file + "-wal"));
+    const auto look = [&] {
+        std::unique_ptr<engine::Database> database;
+        if (engine::Open(file, database_).Failed()) return 1;
+        std::unique_ptr<engine::Connection> connection;
+        if (database_->Connect({"", "", true}, stop_, connection_).Failed()) return 2;
+        if (Query("select n from t") != "1;") return 3;
+        if (Run("insert into t values(2)") != 16000) return 4;
+        if (Run("create table u(n integer)") != 16000) return 5;
+        if (Query("select n from t") != "1;") return 6;
+        return 0;
+    };
+    ASSERT_EQ(chmod(file.c_str(), 0444), 0);
+    ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
+    EXPECT_EQ(AsNobody(look), 0) << "neither the file nor its folder";
+    ASSERT_EQ(chmod(folder_.c_str(), 0777), 0);
+    EXPECT_EQ(AsNobody(look), 0) << "the file";
+    ASSERT_EQ(chmod(file.c_str(), 0666), 0);
+    for (const char* end : {"-wal", "-shm"}) fs::remove(file + end);
+    ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
+    EXPECT_EQ(AsNobody(look), 0) << "the folder";
+}
+
+// Pages that lie in an unwritable file may be of two times once somebody else has written it: no answer then.
+TEST_F(Sqlite, FileThatIsWrittenAllTheSameIsReadNoMore) {
+    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    connection_.reset();
+    database_.reset();
+    const std::string file = folder_ + "/test.db";
+    ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
+    int ready[2], written[2];
+    ASSERT_TRUE(pipe(ready) == 0 && pipe(written) == 0);
+    std::thread writer([&] {
+        char byte = 0;
+        (void)!read(ready[0], &byte, 1);
+        sqlite3* database = nullptr;
+        sqlite3_open(file.c_str(), &database);
+        sqlite3_exec(database, "insert into t values(1)", nullptr, nullptr, nullptr);
+        (void)!write(written[1], &byte, 1);
+        sqlite3_close(database);
+    });
+    const auto look = [&] {
+        char byte = 'x';
+        const bool opened = engine::Open(file, database_).Ok();
+        if (opened) connection_ = Connect();
+        const bool empty = opened && Query("select n from t").empty();
+        (void)!write(ready[1], &byte, 1);
+        (void)!read(written[0], &byte, 1);
+        if (!opened || !empty) return 1;
+        if (Query("select n from t") != "error 3113" || !connection_->Broken()) return 2;
+        connection_.reset();
+        return 0;
+    };
+    EXPECT_EQ(geteuid() == 0 ? AsNobody(look) : 0, 0) << "needs a writer who may, as root may";
+    if (geteuid() != 0) (void)!write(ready[1], "x", 1);
+    writer.join();
+    for (const int end : {ready[0], ready[1], written[0], written[1]}) close(end);
 }
 
 }  // namespace

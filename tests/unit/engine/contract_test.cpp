@@ -1,0 +1,733 @@
+// The contract of the door, a sentence a test, for any engine: the SQL is plain enough for all of them. What the contract
+// leaves to an engine is asked of its capabilities.
+#include <atomic>
+#include <chrono>
+#include <functional>
+#include <set>
+#include <thread>
+
+#include "engine/engine_fixture.h"
+
+namespace {
+
+using engine::TransactionMode;
+using namespace std::chrono_literals;
+
+struct Engine {
+    const char* name;
+    std::string (*fresh_database)(const std::string& folder);
+    bool shared;    // several sessions see the same tables
+};
+
+class Contract : public EngineFixture, public testing::WithParamInterface<Engine> {
+protected:
+    std::string FreshName() override { return GetParam().fresh_database(folder_); }
+    void MakeNumbers(int count = 3) {
+        ASSERT_EQ(Run("create table t(n integer)"), 0);
+        for (int n = 1; n <= count; ++n) ASSERT_EQ(Run("insert into t values(%1)", {Integer(n)}), 0);
+        ASSERT_EQ(Answer(connection_->Commit()), 0);
+    }
+    std::string All() { return Query("select n from t order by n"); }
+    std::string Count() { return Query("select count(*) from t"); }
+};
+
+// What takes two sessions that see the same tables.
+class SharedContract : public Contract {};
+
+// ---- Values
+
+TEST_P(Contract, ValuesComeBackAsTheyWent) {
+    ASSERT_EQ(Run("create table v(i integer, d double precision, n numeric(38), t varchar(20), c char(3), m timestamp)"),
+              0);
+    const OCINumber number = Number("12345678901234567890123456789012345678");
+    const date::DateTime moment{.year = 2024, .month = 2, .day = 29, .hour = 13, .minute = 14, .second = 15,
+                                .nanosecond = 123456000};
+    const std::vector<Datum> values{Integer(-7),      Real(0.5),  Decimal(number),
+                                    Text("a\xC3\xA4"), Text("x"), Moment(moment)};
+    ASSERT_EQ(Run("insert into v values(%1, %2, %3, %4, %5, %6)", values), 0);
+    const char* row = "-7,real 0.5,decimal 12345678901234567890123456789012345678,a\xC3\xA4,x  ,"
+                      "time 2024-02-29 13:14:15.123456;";
+    EXPECT_EQ(Query("select * from v"), row);
+    EXPECT_EQ(Query("select * from v where i = %1 and n = %2 and m = %3", {values[0], values[2], values[5]}), row);
+    ASSERT_EQ(Run("delete from v"), 0);
+    ASSERT_EQ(Run("insert into v values(%1, %1, %1, %1, %1, %1)", {Null()}), 0);
+    EXPECT_EQ(Query("select * from v"), "null,null,null,null,null,null;");
+}
+
+TEST_P(Contract, RowIdNamesItsRow) {
+    MakeNumbers();
+    struct : engine::RowSink {
+        engine::RowId row;
+        Status Row(std::uint32_t, std::span<const Datum> values) override {
+            row = values[0].Row();
+            return {};
+        }
+    } taken;
+    const auto query = Opened("select rowid from t where n = 2");
+    EXPECT_EQ(query->Columns()[0].type, SQLT_RDD);
+    bool more = false;
+    ASSERT_EQ(Answer(query->Fetch(taken, 1, more)), 0);
+    EXPECT_EQ(Query("select n from t where rowid = %1", {Row(taken.row)}), "2;");
+
+    engine::ArrayOutcome outcome;
+    Rows none;
+    ASSERT_TRUE(Prepared("update t set n = 20 where n = 2")->ExecuteArray(none, {}, outcome).Ok());
+    EXPECT_EQ(outcome.last_row.value_or(taken.row), taken.row);
+    engine::ArrayOutcome nothing;
+    ASSERT_TRUE(Prepared("update t set n = 20 where n = 99")->ExecuteArray(none, {}, nothing).Ok());
+    EXPECT_FALSE(nothing.last_row) << "no row was touched";
+}
+
+// ---- Array executions
+
+TEST_P(Contract, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
+    ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
+    const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
+    Rows rows{{Integer(1)}, {Integer(1)}, {Integer(2)}, {Integer(2)}, {Integer(3)}};
+    engine::ArrayOutcome stopped;
+    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 0, .last = 5}, stopped).Ok());
+    EXPECT_EQ(stopped.executed, 1u);
+    ASSERT_EQ(stopped.failures.size(), 1u);
+    EXPECT_EQ(stopped.failures[0].row, 1u);
+    EXPECT_EQ(stopped.failures[0].status.Number(), 1);
+    EXPECT_EQ(All(), "1;") << "the row before the failure stays";
+
+    rows.refused_row = 4;
+    engine::ArrayOutcome all;
+    all.affected = 10;
+    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 1, .last = 5, .all_rows = true}, all).Ok());
+    EXPECT_EQ(all.executed, 1u);
+    EXPECT_EQ(all.affected, 11u) << "added to what was there";
+    ASSERT_EQ(all.failures.size(), 3u);
+    EXPECT_EQ(all.failures[0].row, 1u);
+    EXPECT_EQ(all.failures[1].row, 3u);
+    EXPECT_EQ(all.failures[2].row, 4u);
+    EXPECT_EQ(all.failures[2].status.Number(), 1722) << "what the source refuses";
+    EXPECT_EQ(All(), "1;2;");
+}
+
+TEST_P(Contract, ChangesReturnTheirRowsByExecution) {
+    MakeNumbers();
+    const auto update = Prepared("update t set n = n + 10 where n <= %1 returning n, n - 10", std::vector{Integer(1)});
+    ASSERT_EQ(update->Columns().size(), 2u);
+    Rows rows{{Integer(1)}, {Integer(3)}, {Integer(0)}};
+    Written written;
+    engine::ArrayOutcome outcome;
+    ASSERT_TRUE(update->ExecuteArray(rows, {.first = 0, .last = 3, .returned = &written}, outcome).Ok());
+    EXPECT_EQ(written.text, "11,1;1:12,2;1:13,3;");
+    EXPECT_EQ(outcome.affected, 3u);
+    EXPECT_EQ(outcome.executed, 3u);
+
+    engine::ArrayOutcome unseen;
+    ASSERT_TRUE(update->ExecuteArray(rows, {}, unseen).Ok()) << "nobody takes the rows";
+}
+
+TEST_P(Contract, ExecutionWhoseRowsAreRefusedIsUndone) {
+    MakeNumbers();
+    const auto update = Prepared("update t set n = n + 10 where n = %1 or n = %2 returning n",
+                                 std::vector{Integer(1), Integer(1)});
+    Rows rows{{Integer(1), Integer(1)}, {Integer(2), Integer(3)}, {Integer(11), Integer(11)}};
+    for (const bool all_rows : {false, true}) {
+        Written written;
+        written.refused = 3;    // the second row of the second execution
+        engine::ArrayOutcome outcome;
+        const engine::ArrayRun run{.first = 0, .last = 3, .all_rows = all_rows, .returned = &written};
+        ASSERT_TRUE(update->ExecuteArray(rows, run, outcome).Ok());
+        ASSERT_EQ(outcome.failures.size(), 1u);
+        EXPECT_EQ(outcome.failures[0].row, 1u);
+        EXPECT_EQ(outcome.failures[0].status.Number(), 1405);
+        EXPECT_EQ(outcome.affected, all_rows ? 2u : 1u);
+        EXPECT_EQ(All(), all_rows ? "2;3;21;" : "2;3;11;");
+        ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    }
+    EXPECT_EQ(All(), "1;2;3;");
+}
+
+// ---- Transactions
+
+TEST_P(Contract, WhatAStatementDoesBeginsAndEndsTransactions) {
+    MakeNumbers();
+    EXPECT_EQ(Count(), "3;");
+    EXPECT_FALSE(connection_->InTransaction()) << "reading begins none";
+    EXPECT_EQ(Run("insert into t values(4)"), 0);
+    EXPECT_TRUE(connection_->InTransaction()) << "changing does";
+    EXPECT_EQ(Run("create table u(n integer)"), 0);
+    EXPECT_FALSE(connection_->InTransaction()) << "defining commits";
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(Count(), "4;");
+
+    EXPECT_EQ(Run("insert into t values(4)"), 0);
+    EXPECT_EQ(Run("create unique index i on t(n)"), 1) << "fails when it runs";
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(Count(), "5;") << "what was done before is committed all the same";
+
+    EXPECT_EQ(Run("savepoint here"), 0);
+    EXPECT_TRUE(connection_->InTransaction());
+    EXPECT_EQ(Run("insert into t values(5)"), 0);
+    EXPECT_EQ(Run("rollback to savepoint here"), 0);
+    EXPECT_EQ(Count(), "5;");
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    EXPECT_FALSE(connection_->InTransaction());
+}
+
+TEST_P(Contract, LockingQueryBeginsATransaction) {
+    MakeNumbers();
+    std::unique_ptr<engine::Query> query;
+    std::uint32_t offset = 0;
+    ASSERT_EQ(Answer(connection_->Compile({"select n from t order by n", Effect::locks, {}}, query, offset)), 0);
+    Rows none;
+    ASSERT_EQ(Answer(query->Open(none, {})), 0);
+    EXPECT_TRUE(connection_->InTransaction());
+    EXPECT_EQ(Rest(*query), "1;2;3;");
+    EXPECT_TRUE(connection_->InTransaction());
+}
+
+TEST_P(Contract, StatementThatFailsUndoesItselfAndNotTheTransaction) {
+    ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
+    EXPECT_EQ(Run("insert into t select 1 union all select 1"), 1);
+    EXPECT_FALSE(connection_->InTransaction()) << "it began one and did nothing in it";
+    EXPECT_EQ(Run("insert into t values(5)"), 0);
+    EXPECT_EQ(Run("insert into t select 6 union all select 5"), 1);
+    EXPECT_TRUE(connection_->InTransaction());
+    EXPECT_EQ(All(), "5;");
+}
+
+TEST_P(SharedContract, EndOfTheSessionRollsBack) {
+    MakeNumbers();
+    const auto other = Connect();
+    ASSERT_EQ(Run("insert into t values(4)"), 0);
+    EXPECT_EQ(Query(*other, "select count(*) from t"), "3;") << "nobody sees what is not committed";
+    connection_.reset();
+    EXPECT_EQ(Query(*other, "select count(*) from t"), "3;");
+    ASSERT_EQ(Run(*other, "insert into t values(4)"), 0) << "nothing is locked any more";
+    ASSERT_EQ(Answer(other->Commit()), 0);
+    EXPECT_EQ(Query(*Connect(), "select count(*) from t"), "4;");
+}
+
+TEST_P(Contract, MarksNest) {
+    MakeNumbers(1);
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    EXPECT_TRUE(connection_->InTransaction());
+    EXPECT_EQ(Run("insert into t values(2)"), 0);
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    EXPECT_EQ(Run("insert into t values(3)"), 0);
+    ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
+    EXPECT_EQ(All(), "1;2;");
+    EXPECT_EQ(Run("insert into t values(4)"), 0);
+    ASSERT_EQ(Answer(connection_->UndoToMark()), 0) << "the mark stays";
+    EXPECT_EQ(All(), "1;2;");
+    EXPECT_EQ(Run("insert into t values(5)"), 0);
+    ASSERT_EQ(Answer(connection_->DropMark()), 0);
+    EXPECT_EQ(All(), "1;2;5;");
+    ASSERT_EQ(Answer(connection_->UndoToMark()), 0) << "to the outer mark";
+    EXPECT_EQ(All(), "1;");
+    ASSERT_EQ(Answer(connection_->DropMark()), 0);
+    EXPECT_EQ(Answer(connection_->DropMark()), 1086);
+    EXPECT_EQ(Answer(connection_->UndoToMark()), 1086);
+    EXPECT_TRUE(connection_->InTransaction());
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    EXPECT_EQ(Answer(connection_->UndoToMark()), 1086) << "the end of the transaction forgets them";
+}
+
+TEST_P(Contract, ReadOnlyTransactionRefusesChangesAndSeesWhatThereWas) {
+    MakeNumbers();
+    const auto other = GetParam().shared ? Connect() : nullptr;
+    for (const TransactionMode mode : {TransactionMode::read_only, TransactionMode::serializable}) {
+        ASSERT_EQ(Answer(connection_->Begin(mode)), 0);
+        EXPECT_TRUE(connection_->InTransaction());
+        EXPECT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0) << "does nothing";
+        if (other) {
+            EXPECT_EQ(Run(*other, "insert into t values(4)"), 0);
+            EXPECT_EQ(Answer(other->Commit()), 0);
+        }
+        EXPECT_EQ(All(), "1;2;3;");
+        if (mode == TransactionMode::read_only) {
+            EXPECT_EQ(Run("insert into t values(9)"), 1456);
+            EXPECT_EQ(Run("delete from t where n < 0"), 1456);
+        }
+        EXPECT_TRUE(connection_->InTransaction());
+        ASSERT_EQ(Answer(connection_->Commit()), 0);
+        EXPECT_EQ(All(), other ? "1;2;3;4;" : "1;2;3;");
+        EXPECT_EQ(Run("delete from t where n = 4"), 0) << "the next transaction changes as ever";
+        ASSERT_EQ(Answer(connection_->Commit()), 0);
+    }
+}
+
+TEST_P(Contract, DefinitionEndsAReadOnlyTransaction) {
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_only)), 0);
+    EXPECT_EQ(Run("create table t(n integer)"), 0);
+    EXPECT_FALSE(connection_->InTransaction());
+}
+
+TEST_P(SharedContract, LockedRowsAnswerAfterAWhile) {
+    MakeNumbers();
+    const auto other = Connect();
+    ASSERT_EQ(Run(*other, "update t set n = n + 1"), 0);
+    EXPECT_EQ(Run("update t set n = n + 2"), 54);
+    EXPECT_FALSE(connection_->InTransaction());
+    EXPECT_EQ(All(), "1;2;3;") << "readers go on";
+    ASSERT_EQ(Answer(other->Rollback()), 0);
+    EXPECT_EQ(Run("update t set n = n + 2"), 0);
+}
+
+TEST_P(Contract, TwoPhaseIsRefusedWhereItIsNoCapability) {
+    ASSERT_FALSE(database_->GetCapabilities().two_phase) << "give engines that can tests of their own";
+    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    ASSERT_EQ(Run("insert into t values(1)"), 0);
+    const engine::Xid xid{.format = 1, .global_length = 1, .data = {'x'}};
+    bool read_only = false;
+    std::vector<engine::Xid> prepared;
+    EXPECT_EQ(Answer(connection_->Prepare(xid, read_only)), 1022);
+    EXPECT_EQ(Answer(connection_->CommitPrepared(xid)), 1022);
+    EXPECT_EQ(Answer(connection_->RollbackPrepared(xid)), 1022);
+    EXPECT_EQ(Answer(connection_->Recover(prepared)), 1022);
+    EXPECT_TRUE(connection_->InTransaction()) << "the transaction is as it was";
+    EXPECT_EQ(database_->GetCapabilities().lobs, connection_->Lobs() != nullptr);
+}
+
+// ---- Open queries
+
+TEST_P(Contract, FetchDeliversUpToWhatIsAskedFor) {
+    MakeNumbers(5);
+    const auto query = Opened("select n from t order by n");
+    EXPECT_TRUE(query->IsOpen());
+    Written rows;
+    bool more = false;
+    ASSERT_EQ(Answer(query->Fetch(rows, 2, more)), 0);
+    EXPECT_EQ(rows.text, "1;2;");
+    EXPECT_TRUE(more);
+    rows.refused = 3;
+    EXPECT_EQ(Answer(query->Fetch(rows, 9, more)), 1405) << "what the sink answers";
+    EXPECT_TRUE(query->IsOpen());
+    ASSERT_EQ(Answer(query->Fetch(rows, 9, more)), 0);
+    EXPECT_EQ(rows.text, "1;2;4;5;") << "on behind the refused row";
+    EXPECT_FALSE(more);
+    EXPECT_FALSE(query->IsOpen());
+    EXPECT_EQ(Answer(query->Fetch(rows, 1, more)), 1002);
+    EXPECT_FALSE(more);
+
+    Rows none;
+    ASSERT_EQ(Answer(query->Open(none, {})), 0);
+    ASSERT_EQ(Answer(query->Open(none, {})), 0) << "one that is open is closed first";
+    EXPECT_EQ(Fetched(*query, 1), "1;");
+    query->Close();
+    query->Close();
+    EXPECT_EQ(Fetched(*query, 1), "error 1002");
+    const auto empty = Opened("select n from t where n > 99");
+    EXPECT_TRUE(empty->IsOpen());
+    EXPECT_EQ(Rest(*empty), "");
+    EXPECT_FALSE(empty->IsOpen());
+}
+
+TEST_P(Contract, QueryTakesItsValuesOver) {
+    MakeNumbers();
+    const auto query = Prepared("select %1, n from t order by n", std::vector{Text("")});
+    {
+        std::string text = "kept while the query is open";
+        Rows source{{Text(text)}};
+        ASSERT_EQ(Answer(query->Open(source, {})), 0);
+        std::fill(text.begin(), text.end(), '?');
+    }
+    EXPECT_EQ(Fetched(*query, 1), "kept while the query is open,1;");
+    EXPECT_EQ(Rest(*query), "kept while the query is open,2;kept while the query is open,3;");
+}
+
+TEST_P(Contract, OpenQueryDeliversTheRowsThatThereWereWhenItWasOpened) {
+    const struct {
+        const char* what;
+        std::function<void()> happens;
+    } cases[] = {
+        {"a change", [&] { EXPECT_EQ(Run("update t set n = n + 10"), 0); }},
+        {"a change that returns rows", [&] { EXPECT_EQ(Run("delete from t returning n"), 0); }},
+        {"a definition", [&] { EXPECT_EQ(Run("drop table t"), 0); }},
+        {"a commit of its own rows", [&] { EXPECT_EQ(Answer(connection_->Commit()), 0); }},
+        {"a rollback of its own rows", [&] { EXPECT_EQ(Answer(connection_->Rollback()), 0); }},
+        {"an undo of its own rows",
+         [&] {
+             EXPECT_EQ(Answer(connection_->UndoToMark()), 0);
+             EXPECT_EQ(Answer(connection_->DropMark()), 0);
+         }},
+        {"a savepoint's undo", [&] { EXPECT_EQ(Run("rollback to savepoint here"), 0); }},
+        {"a later query", [&] { EXPECT_EQ(Count(), "3;"); }},
+        {"a begin", [&] { EXPECT_EQ(Answer(connection_->Begin(TransactionMode::read_only)), 0); }},
+    };
+    for (const auto& c : cases) {
+        for (const bool scrollable : {false, true}) {
+            ASSERT_EQ(Run("create table t(n integer)"), 0);
+            ASSERT_EQ(Run("savepoint here"), 0);
+            ASSERT_EQ(Answer(connection_->SetMark()), 0);
+            ASSERT_EQ(Run("insert into t select 1 union all select 2 union all select 3"), 0);
+            const auto first = Opened("select n from t order by n", {.scrollable = scrollable});
+            const auto unread = Opened("select n from t order by n", {.scrollable = scrollable});
+            ASSERT_EQ(Fetched(*first, 1), "1;");
+            c.happens();
+            EXPECT_EQ(Rest(*first), "2;3;") << c.what;
+            EXPECT_EQ(Rest(*unread), "1;2;3;") << c.what;
+            first->Close();
+            unread->Close();
+            ASSERT_EQ(Answer(connection_->Rollback()), 0);
+            (void)Run("drop table t");
+        }
+    }
+}
+
+TEST_P(SharedContract, OpenQueryNeitherHindersNorSeesAnotherSession) {
+    MakeNumbers();
+    const auto other = Connect();
+    const auto open = Opened("select n from t order by n");
+    ASSERT_EQ(Fetched(*open, 1), "1;");
+    EXPECT_EQ(Run(*other, "insert into t values(4)"), 0);
+    EXPECT_EQ(Answer(other->Commit()), 0);
+    EXPECT_EQ(Count(), "4;") << "a query begun later sees it";
+    EXPECT_EQ(Run("update t set n = n + 10"), 0) << "a write after a stale read";
+    EXPECT_EQ(Rest(*open), "2;3;");
+}
+
+TEST_P(Contract, ScrollableQueryGoesToAnyPosition) {
+    MakeNumbers(5);
+    const auto query = Opened("select n from t order by n", {.scrollable = true});
+    const auto at = [&](std::uint64_t position) {
+        Written row;
+        bool found = true;
+        const Status status = query->Scroll(position, row, found);
+        return !status.Ok() ? "error " + std::to_string(status.Number()) : found ? row.text : "none";
+    };
+    EXPECT_EQ(at(3), "3;");
+    EXPECT_EQ(Fetched(*query, 1), "4;");
+    EXPECT_EQ(at(1), "1;");
+    std::uint64_t rows = 0;
+    ASSERT_EQ(Answer(query->Count(rows)), 0);
+    EXPECT_EQ(rows, 5u);
+    EXPECT_EQ(Fetched(*query, 2), "2;3;") << "counting moves nothing";
+    EXPECT_EQ(at(0), "none");
+    EXPECT_EQ(Fetched(*query, 1), "1;") << "from before the first";
+    EXPECT_EQ(at(6), "none");
+    EXPECT_EQ(Rest(*query), "") << "from behind the last";
+    EXPECT_TRUE(query->IsOpen()) << "the end does not close it";
+    EXPECT_EQ(at(5), "5;");
+    Written refusing;
+    refusing.refused = 1;
+    bool found = false;
+    EXPECT_EQ(Answer(query->Scroll(2, refusing, found)), 1405);
+    EXPECT_EQ(Fetched(*query, 1), "3;") << "it stood there";
+    query->Close();
+    EXPECT_EQ(at(1), "error 1002");
+    EXPECT_EQ(Answer(query->Count(rows)), 1002);
+}
+
+TEST_P(Contract, ColumnsFollowTheTable) {
+    MakeNumbers(1);
+    const auto query = Prepared("select * from t");
+    Rows none;
+    ASSERT_EQ(Answer(query->Open(none, {})), 0);
+    EXPECT_EQ(Rest(*query), "1;");
+    ASSERT_EQ(Run("drop table t"), 0);
+    ASSERT_EQ(Run("create table t(c char(3))"), 0);
+    ASSERT_EQ(Run("insert into t values('x')"), 0);
+    ASSERT_EQ(Answer(query->Open(none, {})), 0);
+    EXPECT_EQ(query->Columns()[0].name, "C");
+    EXPECT_EQ(query->Columns()[0].type, SQLT_AFC);
+    EXPECT_EQ(Rest(*query), "x  ;");
+}
+
+// ---- Stopping
+
+// The first of an endless query's rows is no sooner there than the query is stopped.
+constexpr const char* kEndless =
+    "with recursive r(n) as (select 1 union all select n + 1 from r where n < 2000000000) select max(n) from r";
+
+TEST_P(Contract, RequestStopsTheCallThatRuns) {
+    std::thread breaker([&] {
+        std::this_thread::sleep_for(50ms);
+        stop_->Ask();
+        connection_->Interrupt();
+    });
+    EXPECT_EQ(Query(kEndless), "error 1013");
+    breaker.join();
+    EXPECT_TRUE(stop_->Take()) << "the engine leaves it as it is";
+    EXPECT_EQ(Query("select 1"), "1;");
+}
+
+TEST_P(Contract, StandingRequestStopsWhatExecutesAndFetches) {
+    MakeNumbers();
+    const auto query = Prepared("select n from t order by n");
+    const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
+    Rows rows{{Integer(7)}, {Integer(8)}, {Integer(9)}};
+    stop_->Ask();
+    EXPECT_EQ(Answer(query->Open(rows, {})), 1013);
+    EXPECT_EQ(Execute(*insert, rows, {.first = 0, .last = 3, .all_rows = true}), 1013);
+    EXPECT_TRUE(stop_->Take());
+    EXPECT_FALSE(connection_->InTransaction());
+
+    for (const bool scrollable : {false, true}) {
+        ASSERT_EQ(Answer(query->Open(rows, {.scrollable = scrollable})), 0);
+        stop_->Ask();
+        EXPECT_EQ(Fetched(*query, 1), "error 1013");
+        EXPECT_TRUE(stop_->Take());
+        EXPECT_EQ(Fetched(*query, 1), "error 1002") << "a failure closes the query, which has no end to be taken for";
+    }
+    EXPECT_EQ(Count(), "3;");
+}
+
+TEST_P(Contract, RequestStopsAnArrayThatTriesAllRows) {
+    ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
+    ASSERT_EQ(Run("insert into t values(0)"), 0);
+    struct Asking : Rows {
+        engine::StopRequest& stop;
+        explicit Asking(engine::StopRequest& request) : stop(request) {}
+        Status Row(std::uint32_t row, std::span<Datum> values) override {
+            if (row == 2) stop.Ask();
+            values[0] = Integer(row);
+            return {};
+        }
+    } rows(*stop_);
+    engine::ArrayOutcome outcome;
+    const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
+    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 0, .last = 9, .all_rows = true}, outcome).Ok());
+    EXPECT_TRUE(stop_->Take());
+    EXPECT_EQ(outcome.executed, 1u);
+    ASSERT_EQ(outcome.failures.size(), 2u);
+    EXPECT_EQ(outcome.failures[1].status.Number(), 1013);
+    EXPECT_EQ(All(), "0;1;") << "rows before it stay done";
+}
+
+TEST_P(Contract, WhatEndsOrUndoesLooksAtNoRequest) {
+    MakeNumbers(1);
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    ASSERT_EQ(Run("insert into t values(2)"), 0);
+    stop_->Ask();
+    EXPECT_EQ(Answer(connection_->UndoToMark()), 0);
+    EXPECT_EQ(Answer(connection_->DropMark()), 0);
+    EXPECT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_TRUE(stop_->Take());
+    ASSERT_EQ(Run("insert into t values(3)"), 0);
+    stop_->Ask();
+    EXPECT_EQ(Answer(connection_->Commit()), 0);
+    EXPECT_TRUE(stop_->Take());
+    EXPECT_EQ(All(), "1;3;");
+}
+
+// A thread asks without end; what a stopped step did goes to the last row.
+TEST_P(Contract, UndoIsWholeHoweverOftenStopsAreAskedFor) {
+    MakeNumbers(0);
+    const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
+    Rows rows{{Integer(1)}};
+    const auto open = Prepared("select n from t");
+    std::atomic<bool> done = false;
+    std::thread breaker([&] {
+        for (int turn = 0; !done; ++turn) {
+            if (turn % 3 == 0) std::this_thread::yield();
+            stop_->Ask();
+            connection_->Interrupt();
+        }
+    });
+    int stopped = 0;
+    for (int round = 0; round < 2000; ++round) {
+        (void)stop_->Take();
+        if (connection_->SetMark().Failed()) continue;
+        int failure = 0;
+        for (int step = 0; step < 5 && failure == 0; ++step) failure = Execute(*insert, rows);
+        if (failure != 0) {
+            ++stopped;
+            ASSERT_EQ(failure, 1013);
+            if (connection_->InTransaction()) {
+                ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
+            }
+        } else {
+            ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
+        }
+        if (connection_->InTransaction()) {
+            ASSERT_EQ(Answer(connection_->DropMark()), 0);
+        }
+        ASSERT_EQ(Answer(connection_->Commit()), 0);
+    }
+    done = true;
+    breaker.join();
+    (void)stop_->Take();
+    EXPECT_GT(stopped, 0);
+    EXPECT_EQ(Count(), "0;");
+}
+
+TEST_P(SharedContract, RequestEndsAWaitForALock) {
+    MakeNumbers();
+    const auto other = Connect(std::make_shared<engine::StopRequest>());
+    ASSERT_EQ(Run(*other, "update t set n = n + 1"), 0);
+    std::thread breaker([&] {
+        std::this_thread::sleep_for(50ms);
+        stop_->Ask();
+        connection_->Interrupt();
+    });
+    EXPECT_EQ(Run("update t set n = n + 2"), 1013);
+    breaker.join();
+    EXPECT_TRUE(stop_->Take());
+}
+
+TEST_P(Contract, ConnectionObeysWhomItServes) {
+    const auto theirs = std::make_shared<engine::StopRequest>();
+    connection_->Obey(theirs);
+    stop_->Ask();
+    EXPECT_EQ(Query("select 1"), "1;");
+    theirs->Ask();
+    EXPECT_EQ(Query("select 1"), "error 1013");
+}
+
+// ---- Sessions
+
+TEST_P(Contract, RefusedUserLosesNothing) {
+    connection_.reset();
+    ASSERT_EQ(LogOn("ann", "secret"), 0) << "the first named logon makes the owner";
+    const auto ann = [&] {
+        std::unique_ptr<engine::Connection> connection;
+        EXPECT_EQ(Answer(database_->Connect({"Ann", "secret", false}, stop_, connection)), 0);
+        return connection;
+    };
+    connection_ = ann();
+    ASSERT_EQ(Run("create table kept(n integer)"), 0);
+    connection_.reset();
+    const struct { const char* user; std::string password; } refused[] = {
+        {"ann", "Secret"}, {"ann", std::string("secret\0x", 8)}, {"ann", ""}, {"bob", "secret"}};
+    for (const auto& c : refused) EXPECT_EQ(LogOn(c.user, c.password), 1017) << c.user << ' ' << c.password;
+    connection_ = ann();
+    EXPECT_EQ(Query("select count(*) from kept"), "0;") << "the tables are there after wrong passwords";
+}
+
+TEST_P(Contract, PasswordChangeIsForGood) {
+    connection_.reset();
+    ASSERT_EQ(LogOn("ann", "secret"), 0);
+    ASSERT_EQ(Answer(database_->Connect({"ann", "secret", false}, stop_, connection_)), 0);
+    const struct { const char* user; const char* old_password; std::string new_password; int number; } refused[] = {
+        {"ann", "wrong", "new", 28008},
+        {"bob", "secret", "new", 1017},
+        {"ann", "secret", std::string("a\0b", 3), 1017}};
+    for (const auto& c : refused) {
+        EXPECT_EQ(Answer(connection_->ChangePassword(c.user, c.old_password, c.new_password)), c.number) << c.user;
+    }
+    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    ASSERT_EQ(Run("insert into t values(1)"), 0);
+    EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "new")), 24754) << "a rollback would undo it";
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "new")), 0);
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    connection_.reset();
+    EXPECT_EQ(LogOn("ann", "secret"), 1017);
+    EXPECT_EQ(LogOn("ann", "new"), 0);
+}
+
+TEST_P(Contract, AnotherConnectionIsOfTheSameUserAndSeparate) {
+    MakeNumbers();
+    const auto theirs = std::make_shared<engine::StopRequest>();
+    std::unique_ptr<engine::Connection> another;
+    const int answer = Answer(connection_->Another(theirs, another));
+    if (!GetParam().shared) {
+        EXPECT_EQ(answer, 1022);
+        EXPECT_FALSE(another);
+        return;
+    }
+    ASSERT_EQ(answer, 0);
+    ASSERT_EQ(Run("insert into t values(4)"), 0);
+    EXPECT_EQ(Query(*another, "select count(*) from t"), "3;");
+    stop_->Ask();
+    EXPECT_EQ(Query(*another, "select count(*) from t"), "3;") << "the other's wish is not its";
+}
+
+TEST_P(Contract, ConnectionOutlivesItsDatabase) {
+    MakeNumbers();
+    database_.reset();
+    ASSERT_TRUE(connection_->Ping().Ok());
+    EXPECT_FALSE(connection_->Broken());
+    EXPECT_FALSE(connection_->HasNotices());
+    EXPECT_TRUE(connection_->TakeNotices().empty());
+    std::unique_ptr<engine::Query> query;
+    std::uint32_t offset = 0;
+    Rows none;
+    ASSERT_TRUE(connection_->Compile({"select count(*) from t", Effect::reads, {}}, query, offset).Ok());
+    ASSERT_TRUE(query->Open(none, {}).Ok());
+    EXPECT_EQ(Rest(*query), "3;");
+}
+
+TEST_P(Contract, DatabaseServesAnyNumberOfThreads) {
+    ASSERT_EQ(LogOn("ann", "secret"), 0);
+    std::atomic<int> failures = 0;
+    std::vector<std::thread> threads;
+    for (int thread = 0; thread < 4; ++thread) {
+        threads.emplace_back([&] {
+            for (int turn = 0; turn < 3; ++turn) {
+                std::unique_ptr<engine::Connection> connection;
+                const Status status = database_->Connect({"", "", true}, stop_, connection);
+                if (status.Failed() && status.Number() != 1017) ++failures;
+                if (connection && connection->Ping().Failed()) ++failures;
+                if (database_->Version().empty()) ++failures;
+            }
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_EQ(failures, 0);
+}
+
+TEST_P(Contract, VersionBeginsWithARelease) { EXPECT_GE(std::atoi(database_->Version().c_str()), 10); }
+
+// ---- Texts and objects
+
+TEST_P(Contract, SyntaxErrorTellsItsPlace) {
+    std::unique_ptr<engine::Query> query;
+    std::uint32_t offset = 0;
+    EXPECT_EQ(Answer(connection_->Compile({"select 1 from dual where", Effect::reads, {}}, query, offset)), 921);
+    EXPECT_EQ(Answer(connection_->Compile({"select 1, from t", Effect::reads, {}}, query, offset)), 900);
+    EXPECT_EQ(offset, 10u);
+    EXPECT_FALSE(query);
+    Datum datum = Integer(1);
+    EXPECT_EQ(Answer(connection_->OpenCursor(datum, query)), 932);
+}
+
+TEST_P(Contract, TablesAndViewsAreDescribedAsTheirRowsAre) {
+    ASSERT_EQ(Run("create table t(n numeric(12,2) not null, v varchar(20), c char(5), m timestamp)"), 0);
+    ASSERT_EQ(Run("create view w as select v, n from t"), 0);
+    engine::ObjectDescription object;
+    for (const auto& [name, kind] : {std::pair{"t", engine::ObjectKind::table}, {"T", engine::ObjectKind::any},
+                                     {"w", engine::ObjectKind::view}, {"W", engine::ObjectKind::any}}) {
+        object = {};
+        ASSERT_EQ(Answer(connection_->Describe(name, kind, object)), 0) << name;
+        const bool is_table = name[0] == 't' || name[0] == 'T';
+        EXPECT_EQ(object.kind, is_table ? engine::ObjectKind::table : engine::ObjectKind::view);
+        EXPECT_EQ(object.name, is_table ? "T" : "W");
+        const auto query = Prepared(is_table ? "select * from t" : "select * from w");
+        ASSERT_EQ(object.columns.size(), query->Columns().size());
+        for (std::size_t index = 0; index < object.columns.size(); ++index) {
+            const engine::Column& described = object.columns[index];
+            const engine::Column& listed = query->Columns()[index];
+            EXPECT_EQ(described.name, listed.name);
+            EXPECT_EQ(described.type, listed.type) << listed.name;
+            EXPECT_EQ(described.size, listed.size) << listed.name;
+            EXPECT_EQ(described.precision, listed.precision) << listed.name;
+            EXPECT_EQ(described.scale, listed.scale) << listed.name;
+            EXPECT_EQ(described.nullable, listed.nullable) << listed.name;
+        }
+    }
+    EXPECT_FALSE(object.schema.empty());
+    const std::string schema = object.schema;
+    ASSERT_EQ(Answer(connection_->Describe(schema + ".\"T\"", engine::ObjectKind::any, object)), 0);
+    ASSERT_EQ(Answer(connection_->Describe(schema, engine::ObjectKind::schema, object)), 0);
+    const std::set<std::string> members(object.members.begin(), object.members.end());
+    EXPECT_EQ(members, (std::set<std::string>{"T", "W"}));
+    const struct { const char* name; engine::ObjectKind kind; int number; } missing[] = {
+        {"nowhere", engine::ObjectKind::any, 4043},     {"nowhere", engine::ObjectKind::table, 942},
+        {"nowhere", engine::ObjectKind::view, 942},     {"t", engine::ObjectKind::view, 942},
+        {"w", engine::ObjectKind::table, 942},          {"nowhere.t", engine::ObjectKind::table, 942},
+        {"t", engine::ObjectKind::sequence, 4043},      {"t", engine::ObjectKind::synonym, 4043},
+        {"nowhere", engine::ObjectKind::schema, 4043},  {"nowhere", engine::ObjectKind::database, 4043},
+        {"", engine::ObjectKind::any, 4043},            {"a b", engine::ObjectKind::any, 4043}};
+    for (const auto& c : missing) EXPECT_EQ(Answer(connection_->Describe(c.name, c.kind, object)), c.number) << c.name;
+}
+
+std::string FreshFile(const std::string& folder) { return folder + "/test.db"; }
+std::string InMemory(const std::string&) { return ":memory:"; }
+
+constexpr Engine kSqliteFile{"SqliteFile", FreshFile, true};
+constexpr Engine kSqliteMemory{"SqliteMemory", InMemory, false};
+std::string NameOf(const testing::TestParamInfo<Engine>& info) { return info.param.name; }
+
+INSTANTIATE_TEST_SUITE_P(Engines, Contract, testing::Values(kSqliteFile, kSqliteMemory), NameOf);
+INSTANTIATE_TEST_SUITE_P(Engines, SharedContract, testing::Values(kSqliteFile), NameOf);
+
+}  // namespace

@@ -1,0 +1,93 @@
+// Rows that are kept: every kind of value, any order of reading, and what is left when memory or the disk fails.
+#include <sys/resource.h>
+
+#include <csignal>
+
+#include "engine/engine_fixture.h"
+#include "engine/row_store.h"
+
+namespace {
+
+std::string At(engine::RowStore& store, std::uint64_t index, std::size_t columns) {
+    std::vector<Datum> values(columns);
+    const Status status = store.Read(index, values);
+    if (status.Failed()) return "error " + std::to_string(status.Number());
+    std::string text;
+    for (const Datum& value : values) text += Shown(value) + ';';
+    return text;
+}
+
+TEST(RowStore, KeepsEveryKindOfValue) {
+    engine::RowStore store;
+    {
+        std::string text = "text";
+        OCINumber number = Number("-1.5");
+        date::DateTime moment{.year = -4712, .month = 1, .day = 1};
+        engine::RowId row{{1, 2}};
+        const Datum values[] = {Null(),       Integer(-1), Real(0.5), Text(text), View(Kind::bytes, ""), Decimal(number),
+                                Moment(moment), Row(row),  View(Kind::lob, "loc"), View(Kind::cursor, "c")};
+        ASSERT_TRUE(store.Add(values).Ok());
+        text = "gone";
+        number = {};
+        moment = {};
+        row = {};
+    }
+    EXPECT_EQ(At(store, 0, 10),
+              "null;-1;real 0.5;text;bytes 0;decimal -1.5;time -4712-01-01 00:00:00;row 01020000000000000000;loc;c;");
+    store.Clear();
+    EXPECT_EQ(store.Size(), 0u);
+}
+
+// Sizes about those of blocks; some 100 MB, so that most lie in the file.
+TEST(RowStore, ReadsInAnyOrder) {
+    engine::RowStore store;
+    constexpr std::uint64_t kRows = 4000;
+    const auto size = [](std::uint64_t row) { return row % 1000 == 999 ? 1000000u : static_cast<unsigned>(row * 37 % 50000); };
+    std::string text(1000000, 'x');
+    for (std::uint64_t row = 0; row < kRows; ++row) {
+        const Datum values[] = {Integer(static_cast<std::int64_t>(row)), Text(std::string_view(text).substr(0, size(row)))};
+        ASSERT_TRUE(store.Add(values).Ok());
+    }
+    ASSERT_EQ(store.Size(), kRows);
+    std::uint64_t index = 7;
+    for (int turn = 0; turn < 6000; ++turn) {
+        index = turn < 3000 ? index + 1 : index * 2654435761u + 1;
+        Datum values[2];
+        ASSERT_TRUE(store.Read(index % kRows, values).Ok());
+        ASSERT_EQ(values[0].integer, static_cast<std::int64_t>(index % kRows));
+        ASSERT_EQ(values[1].length, size(index % kRows));
+        ASSERT_EQ(values[1].Text().find_first_not_of('x'), std::string_view::npos);
+    }
+}
+
+// A file that may not grow: the row that does not fit is refused, those before it stay, and so does the next one.
+TEST(RowStore, RefusedRowLeavesTheOthers) {
+    engine::RowStore store;
+    const std::string text(100000, 'x');
+    rlimit before{};
+    ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &before), 0);
+    const auto ignored = std::signal(SIGXFSZ, SIG_IGN);
+    rlimit small = before;
+    small.rlim_cur = 1000000;
+    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &small), 0);
+    std::uint64_t added = 0;
+    Status status;
+    for (; added < 1000; ++added) {
+        const Datum values[] = {Integer(static_cast<std::int64_t>(added)), Text(text)};
+        status = store.Add(values);
+        if (status.Failed()) break;
+    }
+    EXPECT_EQ(status.Number(), 1653);
+    EXPECT_GT(added, 250u);
+    EXPECT_EQ(store.Size(), added);
+    setrlimit(RLIMIT_FSIZE, &before);
+    std::signal(SIGXFSZ, ignored);
+    const Datum last[] = {Integer(-1), Text(text)};
+    ASSERT_TRUE(store.Add(last).Ok());
+    EXPECT_EQ(At(store, added, 2), "-1;" + text + ';');
+    for (std::uint64_t row = 0; row < added; ++row) {
+        ASSERT_EQ(At(store, row, 2), std::to_string(row) + ';' + text + ';');
+    }
+}
+
+}  // namespace
