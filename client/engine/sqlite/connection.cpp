@@ -165,7 +165,7 @@ Status SqliteConnection::Compile(const StatementSource& source, std::unique_ptr<
 }
 
 // `end` tells where the statement ends in the text. None for a text without a statement.
-StatementHandle SqliteConnection::CompileText(std::string_view sql, int& code, std::size_t* end) {
+StatementHandle SqliteConnection::CompileText(std::string_view sql, int& code, std::size_t* end) noexcept {
     sqlite3_stmt* compiled = nullptr;
     const char* rest = nullptr;
     code = sqlite3_prepare_v3(Database(), sql.data(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
@@ -176,7 +176,7 @@ StatementHandle SqliteConnection::CompileText(std::string_view sql, int& code, s
 
 Status SqliteConnection::OpenCursor(const Datum&, std::unique_ptr<Query>&) { return Error(errors::kInconsistentTypes); }
 
-Status SqliteConnection::CompileOwn(Own own) {
+Status SqliteConnection::CompileOwn(Own own) noexcept {
     const auto index = static_cast<std::size_t>(own);
     if (owns_[index]) return {};
     int code = SQLITE_OK;
@@ -184,7 +184,7 @@ Status SqliteConnection::CompileOwn(Own own) {
     return code == SQLITE_OK ? Status() : Failure(Database(), code);
 }
 
-Status SqliteConnection::Run(Own own) {
+Status SqliteConnection::Run(Own own) noexcept {
     Status status = CompileOwn(own);
     if (status.Failed()) return status;
     sqlite3_stmt* statement = owns_[static_cast<std::size_t>(own)].get();
@@ -246,12 +246,7 @@ Status SqliteConnection::SetMark() {
 Status SqliteConnection::UndoToMark() {
     const Unheeding undisturbed(*this);
     ReadAhead(nullptr);
-    Status status;
-    try {
-        status = Run(Own::undo);
-    } catch (const std::bad_alloc&) {
-        status = Error(errors::kOutOfMemory).From("SQLITE");
-    }
+    Status status = Run(Own::undo);
     if (status.Ok() || status.Number() == errors::kNoSuchSavepoint) return status;
     Status undone = Rollback();
     return undone.Failed() ? undone : RolledBack(status);
@@ -289,12 +284,7 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
     return {};
 }
 
-void SqliteConnection::Abandon() noexcept {
-    try {
-        (void)Rollback();    // nothing is lost: there was nothing yet
-    } catch (const std::bad_alloc&) {
-    }
-}
+void SqliteConnection::Abandon() noexcept { (void)Rollback(); }    // nothing is lost: there was nothing yet
 
 // ---- Open queries
 
@@ -351,7 +341,7 @@ int SqliteConnection::OnAccess(void* self, int action, const char* first, const 
 Status SqliteConnection::Stopped() { return Error(errors::kCancelled).From("SQLITE"); }
 
 // A wait for a lock that was given up because of the request is a call that was stopped, too.
-Status SqliteConnection::Failed(int code, Verb verb, bool was_in_transaction) {
+Status SqliteConnection::Failed(int code, Verb verb, bool was_in_transaction) noexcept {
     const bool may_be_stopped = (code & 0xFF) == SQLITE_INTERRUPT || (code & 0xFF) == SQLITE_BUSY;
     Status status = may_be_stopped && Stopping() ? Stopped() : Failure(Database(), code, verb);
     return was_in_transaction && !InTransaction() ? RolledBack(status) : status;

@@ -62,7 +62,7 @@ public:
     [[nodiscard]] bool Stopping() const { return heeds_ && stop_ && stop_->Asked(); }
     [[nodiscard]] static Status Stopped();
     // The status of a call on the database that has just failed.
-    Status Failed(int code, Verb verb, bool was_in_transaction);
+    Status Failed(int code, Verb verb, bool was_in_transaction) noexcept;
 
     // What a statement needs to run.
     struct Entry {
@@ -108,9 +108,9 @@ private:
     static void OnChange(void* self, int operation, const char* schema, const char* table, sqlite3_int64 row);
     static int OnAccess(void* self, int action, const char* first, const char* second, const char* schema,
                         const char* trigger);
-    StatementHandle CompileText(std::string_view sql, int& code, std::size_t* end);
-    Status CompileOwn(Own own);
-    Status Run(Own own);
+    StatementHandle CompileText(std::string_view sql, int& code, std::size_t* end) noexcept;
+    Status CompileOwn(Own own) noexcept;
+    Status Run(Own own) noexcept;
     Status LookOrEnd();
     std::string Encoding();
 

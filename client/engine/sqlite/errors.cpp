@@ -6,6 +6,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
+#include <new>
 #include <string>
 
 namespace engine::sqlite {
@@ -90,17 +91,16 @@ constexpr WordsRow kWords[] = {
     {"", "may not be altered", errors::kInsufficientPrivileges},
 };
 
-// "table t has 3 columns but 2 values were supplied", "2 values for 3 columns"
+// "table t has 3 columns but 2 values were supplied", "2 values for 3 columns"; a message ends in a zero
 int CountMismatch(std::string_view message) {
     int columns = 0;
     int values = 0;
-    const std::string text(message);
-    const std::size_t has = text.rfind(" has ");
-    if (has != std::string::npos &&
-        std::sscanf(text.c_str() + has, " has %d columns but %d values", &columns, &values) == 2) {
+    const std::size_t has = message.rfind(" has ");
+    if (has != std::string_view::npos &&
+        std::sscanf(message.data() + has, " has %d columns but %d values", &columns, &values) == 2) {
         return values < columns ? errors::kTooFewValues : errors::kTooManyValues;
     }
-    const bool told = std::sscanf(text.c_str(), "%d values for %d columns", &values, &columns) == 2;
+    const bool told = std::sscanf(message.data(), "%d values for %d columns", &values, &columns) == 2;
     return !told ? 0 : values < columns ? errors::kTooFewValues : errors::kTooManyValues;
 }
 
@@ -124,34 +124,45 @@ int NumberOf(int code, Verb verb, std::string_view message) {
 
 // A write that has just failed at the limit of the process or the quota of the user: SQLite knows the full disk only,
 // and sqlite3_system_errno() does not tell of commits.
+// Callers empty errno before the call.
 bool MayNotGrow(int code) { return code == SQLITE_IOERR_WRITE && (errno == EFBIG || errno == EDQUOT); }
+
+Status Told(int number, std::string_view words, std::string_view more = {}) noexcept {
+    try {
+        return Error(number, std::string(words).append(more)).From("SQLITE");
+    } catch (const std::bad_alloc&) {
+        return Error(number).From("SQLITE");
+    }
+}
 
 // "number detail", from a function of our own.
 Status ToldByFunction(std::string_view words) {
     const std::size_t blank = words.find(' ');
-    return Error(std::atoi(std::string(words.substr(0, blank)).c_str()), std::string(words.substr(blank + 1)))
-        .From("SQLITE");
+    return Told(std::atoi(words.data()), words.substr(blank + 1));
 }
 
 }  // namespace
 
-Status Failure(int code, std::string_view words) {
-    return Error(NumberOf(code, Verb::other, words), std::string(words)).From("SQLITE");
-}
+Status Failure(int code, std::string_view words) noexcept { return Told(NumberOf(code, Verb::other, words), words); }
 
-Status Failure(sqlite3* database, int code, Verb verb) {
+Status Failure(sqlite3* database, int code, Verb verb) noexcept {
     const int extended = sqlite3_extended_errcode(database);
     const std::string_view words = sqlite3_errmsg(database);
-    if (words.starts_with(kErrorMark)) return ToldByFunction(words.substr(kErrorMark.size()));
+    if ((code & 0xFF) == SQLITE_ERROR && words.starts_with(kErrorMark)) return ToldByFunction(words.substr(kErrorMark.size()));
     const int told = (extended & 0xFF) == (code & 0xFF) ? extended : code;
     const int number = MayNotGrow(told) ? errors::kNoRoom : NumberOf(told, verb, words);
-    return Error(number, std::string(words)).From("SQLITE");
+    return Told(number, words);
 }
 
-Status RolledBack(const Status& failure) {
-    std::string detail = failure.Detail();
-    if (!detail.empty()) detail += "; ";
-    return Error(failure.Number(), detail + "the transaction was rolled back").From("SQLITE");
+Status RolledBack(const Status& failure) noexcept {
+    constexpr std::string_view kWords = "the transaction was rolled back";
+    try {
+        std::string detail = failure.Detail();
+        if (!detail.empty()) detail += "; ";
+        return Told(failure.Number(), detail, kWords);
+    } catch (const std::bad_alloc&) {
+        return Error(failure.Number()).From("SQLITE");
+    }
 }
 
 }  // namespace engine::sqlite

@@ -15,13 +15,14 @@ inline constexpr std::string_view kErrorMark = "kelp error ";
 
 enum class Verb : std::uint8_t { other, insert, update, remove };    // what a statement does to rows
 
-// The status of a call that has just failed on the database.
-Status Failure(sqlite3* database, int code, Verb verb = Verb::other);
+// The status of a call that has just failed on the database; without words where there is no memory for them: the call
+// has failed all the same.
+Status Failure(sqlite3* database, int code, Verb verb = Verb::other) noexcept;
 
 // A failure that has taken the transaction with it: the record says so, too.
-Status RolledBack(const Status& failure);
+Status RolledBack(const Status& failure) noexcept;
 
 // The status of a result code that has no database behind it.
-Status Failure(int code, std::string_view words);
+Status Failure(int code, std::string_view words) noexcept;
 
 }  // namespace engine::sqlite
