@@ -263,7 +263,8 @@ Status Coercion::ApplyDate(Datum& value) {
 }
 
 void Coercion::SetDate(const date::DateTime& date, Datum& value) {
-    Set(value, Kind::text, date_.data(), date::ToEngineText(date, date_.data()));
+    const std::string_view text = WriteDate(date, date_);
+    Set(value, Kind::text, text.data(), text.size());
 }
 
 }  // namespace engine::sqlite

@@ -3,11 +3,11 @@
 // one thread at a time.
 #pragma once
 
-#include <array>
 #include <string>
 
 #include "date/date.h"
 #include "engine/engine.h"
+#include "engine/sqlite/date_text.h"
 #include "oci.h"
 
 namespace engine::sqlite {
@@ -41,7 +41,7 @@ private:
     Column column_;
     Purpose purpose_;
     OCINumber number_{};
-    std::array<char, date::kMaxEngineText> date_{};
+    DateText date_{};
     std::string text_;
 };
 

@@ -143,11 +143,9 @@ void SqliteQuery::DescribeFromRow() {
 Status SqliteQuery::BindDate(int index, const date::DateTime& value, bool copy) {
     if (dates_.empty()) dates_.resize(parameters_.size());
     DateText& text = dates_[static_cast<std::size_t>(index) - 1];
+    const std::string_view view = WriteDate(value, text);
     Datum written;
-    constexpr std::size_t kDatePart = 11;    // with the blank; a time alone has none
-    const std::size_t begin = value.month == 0 ? kDatePart : 0;
-    const std::size_t length = date::ToEngineText(value, text.data());
-    SetView(written, Kind::text, text.data() + begin, length - begin);
+    SetView(written, Kind::text, view.data(), view.size());
     return Bind(index, written, copy);
 }
 

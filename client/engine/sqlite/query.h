@@ -1,7 +1,6 @@
 // One compiled SQLite statement: array executions with borrowed values, and a query's rows as views.
 #pragma once
 
-#include <array>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -11,6 +10,7 @@
 #include "engine/row_store.h"
 #include "engine/sqlite/coercion.h"
 #include "engine/sqlite/connection.h"
+#include "engine/sqlite/date_text.h"
 #include "engine/sqlite/errors.h"
 #include "oci.h"
 
@@ -56,7 +56,6 @@ private:
         RowId row;
         std::string padded;
     };
-    using DateText = std::array<char, date::kMaxEngineText>;
 
     Status Bind(int index, const Datum& value, bool copy);
     Status BindDate(int index, const date::DateTime& value, bool copy);
