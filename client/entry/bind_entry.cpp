@@ -16,10 +16,10 @@ Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4
 }
 
 // Steps of an array of structures, for a bind or a define.
-template <class Area>
-sword SetSteps(const void* handle, OCIError* err, ub4 value, ub4 indicator, ub4 length, ub4 code) {
-    return Enter<Area>(handle, err, [&](Area& area) {
-        area.SetSteps(value, indicator, length, code);
+template <class Handle>
+sword SetSteps(const void* object, OCIError* err, ub4 value, ub4 indicator, ub4 length, ub4 code) {
+    return Enter<Handle>(object, err, [&](Handle& handle) {
+        handle.area->SetSteps(value, indicator, length, code);
         return Status();
     });
 }

@@ -3,6 +3,7 @@
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "sessions/service_context.h"
+#include "statements/execute_locks.h"
 #include "statements/result_set.h"
 #include "statements/statement.h"
 #include "statements/statement_cache.h"
@@ -47,16 +48,18 @@ Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length
 }
 
 sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
-    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+    return EnterWithError<Statement>(stmt, err, [&](Statement& statement, ErrorHandle& error) {
         const LongCall may_take_long;
-        return mode == OCI_DEFAULT ? statement.Fetch(rows, orientation, offset) : Error(errors::kBadMode);
+        return mode == OCI_DEFAULT ? statement.Fetch(error, rows, orientation, offset) : Error(errors::kBadMode);
     });
 }
 
-template <class Area>
-sword SetPiece(dvoid* handle, OCIError* err, const PieceBuffer& piece) {
-    return Enter<Area>(handle, err, [&](Area& area) {
-        return area.statement ? area.statement->SetPieceInfo(area, piece) : Error(errors::kIllegalOperation);
+template <class Handle>
+sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece) {
+    return Enter<Handle>(object, err, [&](Handle& handle) {
+        const std::shared_ptr<StatementShare> owner = handle.area->Owner();
+        Statement* statement = owner ? owner->Find() : nullptr;
+        return statement ? statement->SetPieceInfo(*handle.area, piece) : Error(errors::kIllegalOperation);
     });
 }
 
@@ -82,10 +85,14 @@ sword OCIStmtRelease(OCIStmt* stmt, OCIError* err, const OraText* key, ub4 keyLe
 // Snapshots are not looked at: a query sees what is there when it is executed.
 sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub4 rowoff, const OCISnapshot*,
                      OCISnapshot*, ub4 mode) {
-    return EnterWithError<ServiceContext>(svc, err, [&](ServiceContext& service, ErrorHandle& error) {
-        auto* statement = Live<Statement>(stmt);
+    return EnterError(err, [&](ErrorHandle& error) {
+        auto* service = Live<ServiceContext>(svc);
+        auto* statement = service ? Live<Statement>(stmt) : nullptr;
+        if (!statement) return InvalidHandle();
+        const ExecuteArguments arguments{iters, rowoff, mode};
         const LongCall may_take_long;
-        return statement ? statement->Execute(service, error, {iters, rowoff, mode}) : InvalidHandle();
+        const ExecuteLocks locks(*service, *statement, arguments);
+        return statement->Execute(locks.Target(), error, arguments);
     });
 }
 

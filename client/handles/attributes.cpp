@@ -59,9 +59,11 @@ std::uint64_t LoadInteger(const void* source, std::size_t width) {
 }
 
 // The application gets a pointer into the object: the member itself, or in UTF-16 its converted copy.
-void StoreText(Object& object, std::uint32_t attribute, std::string_view text, void* target, std::uint32_t* size) {
+void StoreText(Object& object, std::uint32_t attribute, const AttributeValue& value, void* target,
+               std::uint32_t* size) {
+    const std::string_view text = value.text;
     std::string_view out = text;
-    if (object.Env().Utf16()) out = TextOut(object.Env(), text, object.KeptText(attribute));
+    if (object.Env().Utf16() && !value.converted) out = TextOut(object.Env(), text, object.KeptText(attribute));
     const char* pointer = out.empty() ? nullptr : out.data();
     std::memcpy(target, &pointer, sizeof pointer);
     if (size) *size = static_cast<std::uint32_t>(out.size());
@@ -71,7 +73,7 @@ void StoreValue(Object& object, const AttributeRow& row, const AttributeValue& v
                 std::uint32_t* size) {
     const std::size_t width = Width(row.shape);
     switch (row.shape) {
-        case Shape::text: return StoreText(object, row.attribute, value.text, target, size);
+        case Shape::text: return StoreText(object, row.attribute, value, target, size);
         case Shape::descriptor: return;
         case Shape::handle:
             std::memcpy(target, &value.pointer, sizeof value.pointer);
@@ -109,6 +111,7 @@ Status SetAttribute(Object& object, const void* source, std::uint32_t size, std:
     if (!row || !row->set) return Error(errors::kUnknownAttribute);
     if (row->size != 0 && size != row->size) return Error(errors::kBadValue);
     AttributeValue value;
+    if (!row->looks_at_value) return row->set(object, value);
     if (row->shape == Shape::handle || row->shape == Shape::descriptor) {
         value.pointer = const_cast<void*>(source);
         return row->set(object, value);

@@ -26,6 +26,7 @@ enum class Shape : std::uint8_t {
 struct AttributeValue {
     std::uint64_t integer = 0;
     std::string_view text;
+    bool converted = false;    // get: the text is in the application's form already
     void* pointer = nullptr;
 };
 
@@ -35,6 +36,7 @@ struct AttributeRow {
     Status (*get)(Object& object, AttributeValue& value);          // null: not readable
     Status (*set)(Object& object, const AttributeValue& value);    // null: not settable
     std::uint32_t size = 0;                                        // bytes: how many a set must have; 0: any
+    bool looks_at_value = true;                                    // false: a set is a signal, whatever it gives
 };
 
 // Adapters from members and free functions to rows.

@@ -12,14 +12,13 @@
 namespace {
 
 Status GetNonBlocking(Server& server, AttributeValue& value) {
-    value.integer = server.non_blocking ? 1 : 0;
+    value.integer = server.NonBlocking();
     return {};
 }
 
 // Each set toggles, whatever the value.
 Status ToggleNonBlocking(Object& object, const AttributeValue&) {
-    auto& server = static_cast<Server&>(object);
-    server.non_blocking = !server.non_blocking;
+    static_cast<Server&>(object).ToggleNonBlocking();
     return {};
 }
 
@@ -44,7 +43,7 @@ Status GetDatabase(Server& server, AttributeValue& value) {
 }
 
 constexpr AttributeRow kRows[] = {
-    {OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, Get<Server, GetNonBlocking>, ToggleNonBlocking},
+    {OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, Get<Server, GetNonBlocking>, ToggleNonBlocking, 0, false},
     {OCI_ATTR_INTERNAL_NAME, Shape::text, GetText<&Server::internal_name>, SetText<&Server::internal_name>},
     {OCI_ATTR_EXTERNAL_NAME, Shape::text, GetText<&Server::external_name>, SetText<&Server::external_name>},
     {OCI_ATTR_FOCBK, Shape::handle, nullptr, TakeFailover},

@@ -2,6 +2,7 @@
 // threads.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <mutex>
@@ -41,7 +42,8 @@ public:
     std::string internal_name;
     std::string external_name;
     std::string group;
-    bool non_blocking = false;
+    [[nodiscard]] bool NonBlocking() const { return non_blocking_.load(std::memory_order_relaxed); }
+    void ToggleNonBlocking() noexcept { non_blocking_.store(!NonBlocking(), std::memory_order_relaxed); }
 
 private:
     // Another thread may free the session meanwhile; it holds the link's serial lock while it does.
@@ -54,6 +56,7 @@ private:
     [[nodiscard]] BegunSession LastBegun() const;
     [[nodiscard]] bool Joined(const Session& session) const;
 
+    std::atomic<bool> non_blocking_{false};
     const bool own_;    // made by a logon and below its service context
     mutable std::mutex mutex_;    // of what follows; nothing else is locked or called while it is held
     std::shared_ptr<engine::Database> database_;    // null when detached

@@ -30,6 +30,20 @@ Status SetHandle(Object& object, const AttributeValue& value) {
     return (static_cast<ServiceContext&>(object).*setter)(handle);
 }
 
+// The mode is the server's; each set toggles it, whatever the value.
+Status GetNonBlocking(ServiceContext& service, AttributeValue& value) {
+    Server* server = nullptr;
+    Status status = service.RequireServer(server);
+    if (status.Ok()) value.integer = server->NonBlocking();
+    return status;
+}
+Status ToggleNonBlocking(Object& object, const AttributeValue&) {
+    Server* server = nullptr;
+    Status status = static_cast<ServiceContext&>(object).RequireServer(server);
+    if (status.Ok()) server->ToggleNonBlocking();
+    return status;
+}
+
 Status GetInCurrentMode(ServiceContext&, AttributeValue& value) {
     value.integer = 1;
     return {};
@@ -41,6 +55,7 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_SESSION, Shape::handle, Get<S, GetSessionHandle>, SetHandle<Session, &S::SetSession>},
     {OCI_ATTR_TRANS, Shape::handle, Get<S, GetTransactionHandle>, SetHandle<TransactionHandle, &S::SetTransaction>},
     {OCI_ATTR_STMTCACHESIZE, Shape::ub4, GetField<&S::statement_cache_size>, SetField<&S::statement_cache_size>},
+    {OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, Get<S, GetNonBlocking>, ToggleNonBlocking, 0, false},
     {OCI_ATTR_IN_V8_MODE, Shape::ub1, Get<S, GetInCurrentMode>, nullptr},
 };
 
@@ -124,7 +139,8 @@ Status ServiceContext::LogOff() {
     if (logged_on_) {
         logged_on_ = false;
         statement_cache_size = 0;
-        server_ = session_ = nullptr;
+        server_ = nullptr;
+        session_ = nullptr;
         return own_server_->Detach();
     }
     return status;

@@ -3,6 +3,7 @@
 // context.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -47,9 +48,9 @@ public:
 private:
     Server& OwnServer();
 
-    const void* server_ = nullptr;
-    const void* session_ = nullptr;
-    const void* transaction_ = nullptr;
+    std::atomic<const void*> server_{nullptr};     // read from any thread
+    std::atomic<const void*> session_{nullptr};
+    std::atomic<const void*> transaction_{nullptr};
     Server* own_server_ = nullptr;      // children; InUse keeps the application from freeing them
     Session* own_session_ = nullptr;
     bool logged_on_ = false;            // by a logon call: server and session are read-only

@@ -5,21 +5,24 @@
 
 #include "statements/data_area.h"
 
-class Bind : public DataArea {
-public:
-    static constexpr Kind kKind = Kind::bind;
-    explicit Bind(const Origin& origin) : DataArea(origin) {}
-    ~Bind() override;
-    [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+struct BindArea : DataArea {
+    using DataArea::DataArea;
 
-    // The element count of an index-table argument; null for a plain or array bind.
+    // An index-table argument: elements in a block, with a count of them. Else a plain or array bind.
     [[nodiscard]] bool IsTable() const { return most_elements > 0 && current_elements; }
 
     ub4 most_elements = 0;
-    ub4* current_elements = nullptr;
-    std::uint32_t rows_returned = 0;
+    ub4* current_elements = nullptr;    // of a table
+    std::uint32_t rows_returned = 0;    // by the last execution of a statement that returns values
 
     // A value that came in pieces, of the iteration that is being collected.
     std::string collected;
     bool collected_null = false;
+};
+
+class Bind final : public AreaHandle<BindArea> {
+public:
+    static constexpr Kind kKind = Kind::bind;
+    using AreaHandle::AreaHandle;
+    [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
 };

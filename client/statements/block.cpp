@@ -1,181 +1,223 @@
 // Statements: blocks. Each step runs once for each iteration. A step that takes index-table arguments runs once for
 // each of their elements; one that gives values into such arguments fills their elements from the first on. Targets
 // that are cursors get the rows of a query to fetch.
+//
+// A block that fails undoes what it did since it last ended a transaction on its way.
 #include <algorithm>
 #include <cstring>
 
 #include "handles/environment.h"
 #include "handles/errors.h"
 #include "statements/result_set.h"
-#include "statements/rows.h"
 #include "statements/statement.h"
 
-// A block that fails undoes what it did, unless it has ended a transaction on its way.
+// What a block does between ends of transactions. Undone unless it is kept, by an exception, too.
+class Statement::Stretch {
+public:
+    explicit Stretch(engine::Connection& engine) : engine_(engine) {}
+    ~Stretch() { if (begun_) (void)Undo(); }
+    Stretch(const Stretch&) = delete;
+    Stretch& operator=(const Stretch&) = delete;
+
+    // To be called before a step that leaves something to undo.
+    Status Begin() {
+        if (begun_) return {};
+        began_transaction_ = !engine_.InTransaction();
+        Status status = engine_.SetMark();
+        begun_ = status.Ok();
+        return status;
+    }
+    // To be called after each step, which may have ended the transaction.
+    void Look() noexcept { begun_ = begun_ && engine_.InTransaction(); }
+    // Keeps what is done. A step may have gone back behind the mark; then there is none to drop.
+    Status Keep() {
+        if (!std::exchange(begun_, false)) return {};
+        Status status = engine_.DropMark();
+        return status.Number() == errors::kNoSuchSavepoint ? Status() : status;
+    }
+    // Ok when nothing is left of it. A mark that could not be gone back to stays.
+    Status Undo() {
+        Look();
+        if (!std::exchange(begun_, false)) return {};
+        if (began_transaction_) return engine_.Rollback();
+        Status status = engine_.UndoToMark();
+        if (status.Ok()) status = engine_.DropMark();
+        return status.Number() == errors::kNoSuchSavepoint ? Status() : status;
+    }
+
+private:
+    engine::Connection& engine_;
+    bool begun_ = false;
+    bool began_transaction_ = false;
+};
+
 Status Statement::RunBlock(const ExecuteArguments& arguments) {
     if (arguments.iterations <= arguments.first) return Error(errors::kNoIterations);
-    const auto has = [this](auto... runs) {
-        return std::any_of(scanned_.steps.begin(), scanned_.steps.end(),
-                           [=](const sql::Step& step) { return ((step.run == runs) || ...); });
-    };
-    if (!has(sql::Run::change) || has(sql::Run::commit, sql::Run::rollback)) return RunSteps(arguments);
-    if (Status status = Engine().Begin(); !status.Ok()) return status;
-    if (Status status = RunText("savepoint kelp_block"); !status.Ok()) return status;
-    Status status = RunSteps(arguments);
-    if (!status.Ok() && !Engine().InTransaction()) return status;    // the engine has undone more than the block
-    Status undone = status.Ok() ? Status() : RunText("rollback to savepoint kelp_block");
-    Status released = RunText("release savepoint kelp_block");
-    if (!undone.Ok()) return undone;
-    return status.Ok() ? released : status;
+    Stretch stretch(Engine());
+    Status status = RunSteps(arguments, stretch);
+    if (status.Ok()) return stretch.Keep();
+    UsedLink()->Answered(status);
+    Status undone = stretch.Undo();
+    return undone.Ok() ? status : undone;
 }
 
-// A statement of the library's own.
-Status Statement::RunText(std::string_view sql) {
-    std::unique_ptr<engine::Query> query;
-    std::uint32_t offset = 0;
-    Rows none;
-    engine::ArrayOutcome outcome;
-    if (Status status = Engine().Prepare(sql, query, offset); !status.Ok()) return status;
-    if (Status status = query->ExecuteArray(none, 0, 1, false, outcome); !status.Ok()) return status;
-    return outcome.failures.empty() ? Status() : std::move(outcome.failures.front().status);
-}
-
-Status Statement::RunSteps(const ExecuteArguments& arguments) {
+Status Statement::RunSteps(const ExecuteArguments& arguments, Stretch& stretch) {
     for (ub4 row = arguments.first; row < arguments.iterations; ++row) {
-        for (std::size_t index = 0; index < scanned_.steps.size(); ++index) {
-            if (Status status = RunStep(index, row); !status.Ok()) return status;
+        for (std::size_t index = 0; index < Scanned().steps.size(); ++index) {
+            Status status = RunStep(index, row, stretch);
+            stretch.Look();
+            if (!status.Ok()) return status;
         }
-        ++row_count_;
+        ++run_.row_count;
     }
     return {};
 }
 
-Status Statement::RunStep(std::size_t index, ub4 row) {
-    const sql::Step& step = scanned_.steps[index];
+Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
+    const sql::Step& step = Scanned().steps[index];
     switch (step.run) {
         case sql::Run::nothing: return {};
-        case sql::Run::begin: return Engine().Begin();
+        case sql::Run::begin: return Engine().Begin(engine::TransactionMode::read_write);
         case sql::Run::commit: return Engine().Commit();
         case sql::Run::rollback: return Engine().Rollback();
         default: break;
     }
     for (const std::uint32_t target : step.targets)
-        if (!bound_[target]) return Error(errors::kNotAllBound);
+        if (!text_.IsBound(target)) return Error(errors::kNotAllBound);
     Compiled* compiled = nullptr;
-    Rows rows;
     if (Status status = Compile(index, compiled); !status.Ok()) return status;
-    if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
-    if (step.run == sql::Run::open_cursor) return OpenCursor(*compiled, rows, step, row);
-    if (!rows.HasTables()) {
-        return IntoTables(step) ? SelectIntoTables(*compiled, rows, step) : RunElement(*compiled, rows, step, row, row);
+    BindRows& rows = compiled->rows;
+    if (Status status = rows.Collect(text_, compiled->text); !status.Ok()) return status;
+    if (step.run == sql::Run::open_cursor) return OpenResult(*compiled, step, row);
+    if (step.run == sql::Run::change || step.run == sql::Run::savepoint) {
+        if (Status status = stretch.Begin(); !status.Ok()) return status;
     }
+    if (!rows.HasTables())
+        return IntoTables(step) ? SelectIntoTables(*compiled, step, row) : RunElement(*compiled, step, row, 0);
     std::uint32_t elements = 0;
     if (Status status = rows.TableElements(elements); !status.Ok()) return status;
     for (const std::uint32_t target : step.targets)
-        if (bound_[target]->IsTable() && bound_[target]->most_elements < elements)
+        if (text_.At(target)->IsTable() && text_.At(target)->most_elements < elements)
             return Error(errors::kBadTableLength);
     for (std::uint32_t element = 0; element < elements; ++element) {
         rows.table_element = element;
-        if (Status status = RunElement(*compiled, rows, step, row, element); !status.Ok()) return status;
+        if (Status status = RunElement(*compiled, step, row, element); !status.Ok()) return status;
     }
     for (const std::uint32_t target : step.targets)
-        if (bound_[target]->IsTable()) *bound_[target]->current_elements = elements;
+        if (text_.IsBound(target) && text_.At(target)->IsTable()) *text_.At(target)->current_elements = elements;
     return {};
 }
 
 bool Statement::IntoTables(const sql::Step& step) const {
-    for (const std::uint32_t target : step.targets)
-        if (bound_[target]->IsTable()) return true;
-    return false;
+    return std::any_of(step.targets.begin(), step.targets.end(),
+                       [this](std::uint32_t target) { return text_.At(target)->IsTable(); });
 }
 
-// A step once: a query or expression into element `element` of its targets, or a change.
-Status Statement::RunElement(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row, std::size_t element) {
+// A step once: a query or expression into the row of its targets, or element `element` of those that are tables, or a
+// change.
+Status Statement::RunElement(Compiled& compiled, const sql::Step& step, ub4 row, ub4 element) {
     const bool gives_value = step.run == sql::Run::query || step.run == sql::Run::assign;
-    if (gives_value) return SelectInto(compiled, rows, step, element, row);
-    if (Status status = Engine().Begin(); !status.Ok()) return status;
-    if (!compiled.query->Columns().empty()) {
-        std::uint64_t count = 0;
-        return ReturnRow(compiled, rows, step, row, count);
-    }
+    if (!gives_value) return Change(compiled, step, row, element);
+    Targets targets(text_, step, *compiled.query, Targets::Layout::one_row);
+    targets.SetElements(row, element);
+    return SelectInto(compiled, targets, row);
+}
+
+Status Statement::Change(Compiled& compiled, const sql::Step& step, ub4 row, ub4 element) {
+    Targets targets(text_, step, *compiled.query, Targets::Layout::each_execution);
+    targets.SetElements(row, element);
+    const bool returns = !compiled.query->Columns().empty();
     engine::ArrayOutcome outcome;
-    if (Status status = compiled.query->ExecuteArray(rows, row, row + 1, false, outcome); !status.Ok()) return status;
-    return outcome.failures.empty() ? Status() : std::move(outcome.failures.front().status);
+    const engine::ArrayRun run{row, row + 1, false, returns ? &targets : nullptr};
+    if (Status status = compiled.query->ExecuteArray(compiled.rows, run, outcome); !status.Ok()) return status;
+    if (!outcome.failures.empty()) return std::move(outcome.failures.front().status);
+    if (returns) SetReturned(step, targets.Rows());
+    return {};
 }
 
 // Exactly one row.
-Status Statement::SelectInto(Compiled& compiled, Rows& rows, const sql::Step& step, std::size_t element, ub4 row) {
+Status Statement::SelectInto(Compiled& compiled, Targets& targets, ub4 row) {
     engine::Query& query = *compiled.query;
-    if (Status status = query.Open(rows, row); !status.Ok()) return status;
-    std::vector<engine::Datum> values(query.Columns().size());
-    bool found = false;
-    Status status = query.Fetch(values, found);
-    if (status.Ok() && !found) status = Error(errors::kNoRows);
-    if (status.Ok()) status = StoreTargets(step, query, values, element);
-    if (status.Ok()) status = query.Fetch(values, found);
+    if (Status status = query.Open(compiled.rows, {row, false, 2}); !status.Ok()) return status;
+    bool more = true;
+    Status status = query.Fetch(targets, 2, more);
     query.Close();
-    if (!status.Ok()) return status;
-    return found ? Error(errors::kTooManyRows) : Status();
-}
-
-// All rows, one an element; 1414 when there are more than the tables can take.
-Status Statement::SelectIntoTables(Compiled& compiled, Rows& rows, const sql::Step& step) {
-    engine::Query& query = *compiled.query;
-    if (Status status = query.Open(rows, 0); !status.Ok()) return status;
-    std::vector<engine::Datum> values(query.Columns().size());
-    ub4 most = ~ub4{0};
-    for (const std::uint32_t target : step.targets) {
-        const Bind& bind = *bound_[target];
-        most = std::min(most, bind.IsTable() ? bind.most_elements : 1);
-    }
-    ub4 count = 0;
-    Status status;
-    for (bool found = true; status.Ok();) {
-        status = query.Fetch(values, found);
-        if (!status.Ok() || !found) break;
-        status = count < most ? StoreTargets(step, query, values, count++) : Error(errors::kBadTableLength);
-    }
-    query.Close();
-    for (const std::uint32_t target : step.targets)
-        if (bound_[target]->IsTable()) *bound_[target]->current_elements = count;
+    if (status.Ok() && targets.Rows() == 0) status = Error(errors::kNoRows);
     return status;
 }
 
-// The element points to a statement handle or a result-set descriptor, or is null and gets a new statement.
-Status Statement::OpenCursor(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row) {
-    Bind& bind = *bound_[step.targets[0]];
-    if (bind.Type()->family != values::Family::cursor) return Error(errors::kBlockError);
-    char* place = bind.elements.Value(row);
-    if (!place) return Error(errors::kBadResultSet);
-    if (Status status = compiled.query->Open(rows, row); !status.Ok()) return status;
-    std::unique_ptr<engine::Query> query = std::move(compiled.query);
+// All rows, one an element; 1414 when there are more than the tables can take.
+Status Statement::SelectIntoTables(Compiled& compiled, const sql::Step& step, ub4 row) {
+    engine::Query& query = *compiled.query;
+    Targets targets(text_, step, query, Targets::Layout::tables);
+    targets.SetElements(row, 0);
+    if (Status status = query.Open(compiled.rows, {row, false, 0}); !status.Ok()) return status;
+    constexpr std::uint32_t kBatch = 1000;
+    Status status;
+    for (bool more = true; more && status.Ok();) status = query.Fetch(targets, kBatch, more);
+    query.Close();
+    for (const std::uint32_t target : step.targets)
+        if (text_.IsBound(target) && text_.At(target)->IsTable()) *text_.At(target)->current_elements = targets.Rows();
+    return status;
+}
 
+// ---- Results
+
+namespace {
+
+// The statement that an element points to: a statement handle or a result-set descriptor. Null for any other pointer.
+Statement* ResultTarget(const char* place) {
     void* pointer;
     std::memcpy(&pointer, place, sizeof pointer);
-    Statement* target = Live<Statement>(pointer);
-    if (!target) target = Live<ResultSet>(pointer);
-    if (!target && pointer) return Error(errors::kBadResultSet);
-    if (target == this) return Error(errors::kBadResultSet);
+    Statement* statement = Live<Statement>(pointer);
+    return statement ? statement : Live<ResultSet>(pointer);
+}
+
+}  // namespace
+
+void Statement::CollectResultTargets(const ExecuteArguments& arguments, std::vector<Statement*>& targets) const {
+    if (!Scanned().is_block) return;
+    for (const sql::Step& step : Scanned().steps) {
+        if (step.run != sql::Run::open_cursor || !text_.IsBound(step.targets[0])) continue;
+        const BindArea& bind = *text_.At(step.targets[0]);
+        if (bind.Type()->family != values::Family::cursor || !bind.elements.values) continue;
+        for (ub4 row = arguments.first; row < arguments.iterations; ++row)
+            if (Statement* target = ResultTarget(bind.elements.Value(row))) targets.push_back(target);
+    }
+}
+
+// The element points to a statement, or is null and gets a new one.
+Status Statement::OpenResult(Compiled& compiled, const sql::Step& step, ub4 row) {
+    const std::shared_ptr<BindArea> bind = text_.At(step.targets[0]);
+    if (bind->Type()->family != values::Family::cursor) return Error(errors::kBlockError);
+    char* place = bind->elements.Value(row);
+    if (!place) return Error(errors::kBadResultSet);
+    Statement* target = ResultTarget(place);
+    void* pointer;
+    std::memcpy(&pointer, place, sizeof pointer);
+    if ((!target && pointer) || target == this) return Error(errors::kBadResultSet);
+    if (Status status = compiled.query->Open(compiled.rows, {row, false, prefetch_rows}); !status.Ok()) return status;
+    std::unique_ptr<engine::Query> query = std::move(compiled.query);
     if (!target) target = Create<Statement>(Env(), OCI_HTYPE_STMT, 0);
+    if (!bind->HasHandle()) return Error(errors::kNotAllBound);    // freed by a memory function
     target->TakeResult(std::move(query), UsedLink());
     pointer = target;
     std::memcpy(place, &pointer, sizeof pointer);
-    bind.elements.SetIndicator(row, 0);
-    bind.elements.SetLength(row, sizeof pointer);
-    bind.elements.SetCode(row, 0);
+    bind->elements.SetIndicator(row, 0);
+    bind->elements.SetLength(row, sizeof pointer);
+    bind->elements.SetCode(row, 0);
     return {};
 }
 
 void Statement::TakeResult(std::unique_ptr<engine::Query> query, const std::shared_ptr<Link>& link) {
     Drop();
+    StartAnew();
     Use(link);
-    cursor_.Open(std::move(query));
+    run_.cursor.Open(std::move(query));
     ++link->open_statements;
-    state_ = State::executed;
+    run_.state = Execution::State::executed;
+    run_.fetch_error = 0;
     described_ = true;
-    failed_ = cancelled_ = link_lost_ = false;
-    defines_changed_ = true;
-    row_count_ = 0;
-    rows_fetched_ = 0;
 }
 
 void ResultSet::BecomeStatement() {

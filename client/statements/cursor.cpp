@@ -1,65 +1,90 @@
 #include "statements/cursor.h"
 
-void Cursor::Open(engine::Query& query, bool scrollable) {
+#include <algorithm>
+#include <utility>
+
+namespace {
+
+// Counts what goes through.
+class CountingSink final : public engine::RowSink {
+public:
+    explicit CountingSink(engine::RowSink* behind) : behind_(behind) {}
+    Status Row(std::uint32_t execution, std::span<const engine::Datum> values) override {
+        ++rows;
+        return behind_ ? behind_->Row(execution, values) : Status();
+    }
+    std::uint32_t rows = 0;
+
+private:
+    engine::RowSink* behind_;
+};
+
+}  // namespace
+
+void Cursor::Open(engine::Query& query, bool scrollable) noexcept {
     Close();
     query_ = &query;
     scrollable_ = scrollable;
-    current_.assign(query.Columns().size(), engine::Datum{});
 }
 
-void Cursor::Open(std::unique_ptr<engine::Query> query) {
-    Open(*query, false);
+void Cursor::Open(std::unique_ptr<engine::Query> query) noexcept {
+    Close();
     owned_ = std::move(query);
+    query_ = owned_.get();
 }
 
 void Cursor::Close() noexcept {
     if (query_) query_->Close();
-    owned_.reset();
     query_ = nullptr;
-    at_end_ = false;
+    owned_.reset();
+    scrollable_ = at_end_ = false;
     position_ = reached_ = 0;
-    row_ = {};
-    kept_.Clear();
 }
 
-// Steps the query itself.
-Status Cursor::Read(bool& found) {
-    found = false;
-    if (at_end_) return {};
-    Status status = query_->Fetch(current_, found);
-    if (!status.Ok()) return status;
-    at_end_ = !found;
-    if (!found) return {};
-    ++reached_;
-    if (scrollable_) kept_.Append(current_);
-    return {};
-}
-
-Status Cursor::Next(bool& found) {
-    if (scrollable_) return GoTo(position_ + 1, found);
-    Status status = Read(found);
-    if (found) {
-        row_ = current_;
-        position_ = reached_;
-    }
+Status Cursor::Read(engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered) {
+    delivered = 0;
+    if (scrollable_) return ReadFrom(position_ + 1, sink, most, delivered);
+    if (at_end_ || most == 0) return {};
+    CountingSink counting(&sink);
+    bool more = true;
+    Status status = query_->Fetch(counting, most, more);
+    delivered = counting.rows;
+    reached_ = position_ += delivered;
+    if (status.Ok()) at_end_ = !more;
     return status;
 }
 
-Status Cursor::GoTo(std::uint64_t position, bool& found) {
-    found = position > 0;
-    while (found && reached_ < position) {
-        if (Status status = Read(found); !status.Ok()) return status;
+Status Cursor::ReadFrom(std::uint64_t position, engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered) {
+    CountingSink counting(&sink);
+    bool found = false;
+    delivered = 0;
+    Status status = query_->Scroll(position, counting, found);
+    if (status.Ok() && !found) {
+        position_ = 0;
+        if (position == 0) return {};
+        status = Count(reached_);
+        position_ = reached_ + 1;
+        return status;
     }
-    position_ = found ? position : position == 0 ? 0 : reached_ + 1;
-    if (found) row_ = kept_.Row(position - 1);
-    return {};
+    bool more = true;
+    if (status.Ok() && most > 1) status = query_->Fetch(counting, most - 1, more);
+    delivered = counting.rows;
+    if (delivered == 0) return status;
+    position_ = position + delivered - 1;
+    reached_ = std::max(reached_, position_);
+    return status;
+}
+
+Status Cursor::AnyMore(bool& more) {
+    CountingSink nowhere(nullptr);
+    std::uint32_t delivered = 0;
+    Status status = Read(nowhere, 1, delivered);
+    more = delivered > 0;
+    return status;
 }
 
 Status Cursor::Count(std::uint64_t& rows) {
-    bool found = true;
-    while (found) {
-        if (Status status = Read(found); !status.Ok()) return status;
-    }
-    rows = reached_;
-    return {};
+    Status status = query_->Count(rows);
+    if (status.Ok()) reached_ = rows;
+    return status;
 }

@@ -1,21 +1,21 @@
-// A cursor: the rows of an open query, forward only or scrollable. Rows of a scrollable one are kept as they are
-// reached. Positions count from 1; 0 is before the first row.
+// A cursor: where the application stands in the rows of an open query. The query counts, keeps and scrolls; what is
+// here are the positions that the application sees: from 1, 0 before the first row, one behind the last at the end.
+//
+// Threads: under the statement's serial lock.
 #pragma once
 
 #include <cstdint>
 #include <memory>
-#include <span>
 #include <vector>
 
 #include "engine/engine.h"
-#include "statements/row_buffer.h"
 
 class Cursor {
 public:
     // Takes an open query: borrowed, or owned (result sets).
-    void Open(engine::Query& query, bool scrollable);
-    void Open(std::unique_ptr<engine::Query> query);
-    // Ends the query and forgets the rows.
+    void Open(engine::Query& query, bool scrollable) noexcept;
+    void Open(std::unique_ptr<engine::Query> query) noexcept;
+    // Ends the query.
     void Close() noexcept;
 
     [[nodiscard]] bool IsOpen() const { return query_ != nullptr; }
@@ -25,27 +25,23 @@ public:
     // The highest row reached: the rows fetched so far.
     [[nodiscard]] std::uint64_t Reached() const { return reached_; }
 
-    // Steps to the next row. `found` is false at the end.
-    Status Next(bool& found);
-    // Goes to a row of a scrollable cursor, which `found` says to be there; past the end the position is behind the
-    // last.
-    Status GoTo(std::uint64_t position, bool& found);
-    // Reads a scrollable cursor to its end.
+    // Up to `most` rows behind the position into the sink. `delivered` counts them, with one that the sink refused; it
+    // is below `most` at the end of the rows, or after a failure.
+    Status Read(engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered);
+    // The row at a position of a scrollable cursor, which `found` says to be there, and on up to `most` rows.
+    Status ReadFrom(std::uint64_t position, engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered);
+    // From behind the last row back to it.
+    void StayOnLastRow() noexcept { if (position_ > reached_) position_ = reached_; }
+    // Whether there is a row behind the position, which goes with the answer.
+    Status AnyMore(bool& more);
+    // How many rows a scrollable cursor has.
     Status Count(std::uint64_t& rows);
 
-    // The row at the position; valid until the next call.
-    [[nodiscard]] std::span<const engine::Datum> Row() const { return row_; }
-
 private:
-    Status Read(bool& found);
-
     std::unique_ptr<engine::Query> owned_;
     engine::Query* query_ = nullptr;
     bool scrollable_ = false;
     bool at_end_ = false;    // the query has no more rows
     std::uint64_t position_ = 0;
     std::uint64_t reached_ = 0;
-    std::vector<engine::Datum> current_;
-    std::span<const engine::Datum> row_;
-    RowBuffer kept_;
 };

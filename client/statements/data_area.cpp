@@ -1,72 +1,105 @@
 // Bind and define handles: taking over the application's areas, and the attributes of both.
 #include "statements/data_area.h"
 
-#include "handles/attributes.h"
+#include <utility>
+
 #include "handles/environment.h"
 #include "handles/errors.h"
 #include "statements/bind.h"
 #include "statements/define.h"
-#include "statements/statement.h"
 
 namespace {
 
-constexpr std::uint16_t kUtf16CharacterSet = OCI_UTF16ID;
+template <class Handle>
+DataArea& AreaOf(Object& object) { return *static_cast<Handle&>(object).area; }
 
-Status SetCharacterSet(DataArea& area, const AttributeValue& value) {
-    area.UseCharacterSet(static_cast<std::uint16_t>(value.integer));
+// A member of the area as an attribute.
+template <class Handle, auto member>
+Status GetArea(Object& object, AttributeValue& value) {
+    value.integer = static_cast<std::uint64_t>(AreaOf<Handle>(object).*member);
     return {};
 }
-
-Status GetScale(DataArea& area, AttributeValue& value) {
-    value.integer = static_cast<std::uint64_t>(area.workspace.scale);
+template <class Handle, auto member>
+Status SetArea(Object& object, const AttributeValue& value) {
+    auto& field = AreaOf<Handle>(object).*member;
+    field = static_cast<std::remove_reference_t<decltype(field)>>(value.integer);
     return {};
 }
-Status SetScale(DataArea& area, const AttributeValue& value) {
-    area.workspace.scale = static_cast<std::int8_t>(value.integer);
-    return {};
-}
-Status GetPrecision(DataArea& area, AttributeValue& value) {
-    value.integer = area.workspace.precision;
-    return {};
-}
-Status SetPrecision(DataArea& area, const AttributeValue& value) {
-    area.workspace.precision = static_cast<std::uint8_t>(value.integer);
-    return {};
+template <class Handle, auto member>
+constexpr AttributeRow Kept(std::uint32_t attribute, Shape shape) {
+    return {attribute, shape, GetArea<Handle, member>, SetArea<Handle, member>};
 }
 
-constexpr AttributeRow kCharCount{OCI_ATTR_CHAR_COUNT, Shape::ub4, GetField<&DataArea::character_count>,
-                                  SetField<&DataArea::character_count>};
-constexpr AttributeRow kScale{OCI_ATTR_PDSCL, Shape::ub2, Get<DataArea, GetScale>, Set<DataArea, SetScale>};
-constexpr AttributeRow kPrecision{OCI_ATTR_PDPRC, Shape::ub2, Get<DataArea, GetPrecision>, Set<DataArea, SetPrecision>};
-constexpr AttributeRow kCharSet{OCI_ATTR_CHARSET_ID, Shape::ub2, GetField<&DataArea::character_set>,
-                                Set<DataArea, SetCharacterSet>};
-constexpr AttributeRow kCharForm{OCI_ATTR_CHARSET_FORM, Shape::ub1, GetField<&DataArea::character_form>,
-                                 SetField<&DataArea::character_form>};
-constexpr AttributeRow kMostBytes{OCI_ATTR_MAXDATA_SIZE, Shape::ub4, GetField<&DataArea::most_bytes>,
-                                  SetField<&DataArea::most_bytes>};
-constexpr AttributeRow kMostCharacters{OCI_ATTR_MAXCHAR_SIZE, Shape::ub4, GetField<&DataArea::most_characters>,
-                                       SetField<&DataArea::most_characters>};
-constexpr AttributeRow kPosition{OCI_ATTR_HANDLE_POSITION, Shape::ub4, GetField<&DataArea::position>, nullptr};
+template <class Handle>
+Status SetCharacterSet(Object& object, const AttributeValue& value) {
+    return AreaOf<Handle>(object).UseCharacterSet(static_cast<std::uint16_t>(value.integer));
+}
+template <class Handle>
+Status GetScale(Object& object, AttributeValue& value) {
+    value.integer = static_cast<std::uint64_t>(AreaOf<Handle>(object).workspace.scale);
+    return {};
+}
+template <class Handle>
+Status SetScale(Object& object, const AttributeValue& value) {
+    AreaOf<Handle>(object).workspace.scale = static_cast<std::int8_t>(value.integer);
+    return {};
+}
+template <class Handle>
+Status GetPrecision(Object& object, AttributeValue& value) {
+    value.integer = AreaOf<Handle>(object).workspace.precision;
+    return {};
+}
+template <class Handle>
+Status SetPrecision(Object& object, const AttributeValue& value) {
+    AreaOf<Handle>(object).workspace.precision = static_cast<std::uint8_t>(value.integer);
+    return {};
+}
 
-constexpr AttributeRow kDefineRows[] = {kCharCount, kScale, kPrecision, kCharSet, kCharForm, kMostCharacters,
-                                        kPosition};
-constexpr AttributeRow kBindRows[] = {
-    kCharCount, kScale, kPrecision, kCharSet, kCharForm, kMostBytes, kMostCharacters, kPosition,
-    {OCI_ATTR_ROWS_RETURNED, Shape::ub4, GetField<&Bind::rows_returned>, nullptr}};
+Status GetRowsReturned(Object& object, AttributeValue& value) {
+    value.integer = static_cast<Bind&>(object).area->rows_returned;
+    return {};
+}
+
+template <class H>
+constexpr AttributeRow kCharCount = Kept<H, &DataArea::character_count>(OCI_ATTR_CHAR_COUNT, Shape::ub4);
+template <class H>
+constexpr AttributeRow kScale{OCI_ATTR_PDSCL, Shape::ub2, GetScale<H>, SetScale<H>};
+template <class H>
+constexpr AttributeRow kPrecision{OCI_ATTR_PDPRC, Shape::ub2, GetPrecision<H>, SetPrecision<H>};
+template <class H>
+constexpr AttributeRow kCharSet{OCI_ATTR_CHARSET_ID, Shape::ub2, GetArea<H, &DataArea::character_set>,
+                                SetCharacterSet<H>};
+template <class H>
+constexpr AttributeRow kCharForm = Kept<H, &DataArea::character_form>(OCI_ATTR_CHARSET_FORM, Shape::ub1);
+template <class H>
+constexpr AttributeRow kMostBytes = Kept<H, &DataArea::most_bytes>(OCI_ATTR_MAXDATA_SIZE, Shape::ub4);
+template <class H>
+constexpr AttributeRow kMostCharacters = Kept<H, &DataArea::most_characters>(OCI_ATTR_MAXCHAR_SIZE, Shape::ub4);
+template <class H>
+constexpr AttributeRow kPosition{OCI_ATTR_HANDLE_POSITION, Shape::ub4, GetArea<H, &DataArea::position>, nullptr};
+
+constexpr AttributeRow kDefineRows[] = {kCharCount<Define>, kScale<Define>,          kPrecision<Define>, kCharSet<Define>,
+                                        kCharForm<Define>,  kMostCharacters<Define>, kPosition<Define>};
+constexpr AttributeRow kBindRows[] = {kCharCount<Bind>, kScale<Bind>,    kPrecision<Bind>,
+                                      kCharSet<Bind>,   kCharForm<Bind>, kMostBytes<Bind>,
+                                      kMostCharacters<Bind>, kPosition<Bind>,
+                                      {OCI_ATTR_ROWS_RETURNED, Shape::ub4, GetRowsReturned, nullptr}};
 
 }  // namespace
 
-DataArea::DataArea(const Origin& origin) : Object(origin) {
-    workspace.environment = &Env();
-    workspace.utf16 = Env().Utf16();
+DataArea::DataArea(Object& handle, TypeCode handle_type) : handle_type_(handle_type) {
+    workspace.environment = &handle.Env();
+    workspace.utf16 = handle.Env().Utf16();
+    workspace.holder = &handle;
 }
 
 Status DataArea::Assign(const AreaArguments& arguments, bool in_pieces) {
-    const values::ExternalType* type = values::FindType(arguments.type);
-    if (!type) return Error(errors::kUnknownType);
-    if (in_pieces && !type->in_pieces) return Error(errors::kIllegalForPieces);
+    const values::ExternalType* type = nullptr;
     std::uint32_t size = 0;
-    if (const int error = values::CheckSize(*type, arguments.size, size)) return Error(error);
+    const bool may_be_null = handle_type_ == OCI_HTYPE_BIND;
+    const int error = values::FindType(arguments.type, arguments.size, may_be_null, type, size);
+    if (type && in_pieces && !type->in_pieces) return Error(errors::kIllegalForPieces);
+    if (error != 0) return Error(error);
     type_ = type;
     in_pieces_ = in_pieces;
     piece = {};
@@ -87,17 +120,36 @@ void DataArea::SetSteps(ub4 value, ub4 indicator, ub4 length, ub4 code) {
     elements.code_step = code;
 }
 
-void DataArea::UseCharacterSet(std::uint16_t id) {
+// Character data is UTF-8 or UTF-16; other sets would come out as something else than they say.
+Status DataArea::UseCharacterSet(std::uint16_t id) {
+    if (!values::KnowsCharacterSet(id)) return Error(errors::kBadCharacterSet);
     character_set = id;
-    workspace.utf16 = id == 0 ? Env().Utf16() : id == kUtf16CharacterSet;
+    workspace.utf16 = id == 0 ? workspace.environment->Utf16() : id == OCI_UTF16ID;
+    return {};
 }
 
-std::shared_ptr<std::recursive_mutex> DataArea::Serial() { return statement ? statement->Serial() : nullptr; }
+std::shared_ptr<StatementShare> DataArea::Owner() const {
+    const std::lock_guard lock(owner_mutex_);
+    return owner_;
+}
 
-Bind::~Bind() { if (statement) statement->Forget(*this); }
+void DataArea::SetOwner(std::shared_ptr<StatementShare> owner) noexcept {
+    const std::lock_guard lock(owner_mutex_);
+    owner_.swap(owner);
+}
+
+void DataArea::Leave(const StatementShare* owner) noexcept {
+    std::shared_ptr<StatementShare> left;    // goes after the lock
+    const std::lock_guard lock(owner_mutex_);
+    if (owner_.get() == owner) left.swap(owner_);
+}
+
+void ReleaseArea(DataArea& area, const Object& statement) noexcept {
+    area.SetOwner(nullptr);
+    Object* const handle = area.Handle();
+    if (handle && handle->Parent() == &statement) Destroy(handle);
+}
 
 std::span<const AttributeRow> Bind::Attributes() const { return kBindRows; }
-
-Define::~Define() { if (statement) statement->Forget(*this); }
 
 std::span<const AttributeRow> Define::Attributes() const { return kDefineRows; }

@@ -1,16 +1,22 @@
-// What bind and define handles have in common: where the application keeps the data and in which form, and the buffer
-// that it gave for the next piece of a value.
+// What bind and define handles have in common. The data area says where the application keeps its data and in which
+// form; handle and statement share it, so that neither has to find the other gone: an area whose handle is freed counts
+// as not there, and lives on only as long as the call that works with it.
+//
+// Threads: calls on the handle and on the statement hold the statement's serial lock; HasHandle and Owner need no lock.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
+#include <memory>
+#include <mutex>
 #include <string>
 
+#include "handles/attributes.h"
 #include "handles/object.h"
 #include "handles/status.h"
 #include "oci.h"
+#include "statements/share.h"
 #include "values/conversion.h"
-
-class Statement;
 
 // The arguments that the bind and define calls share.
 struct AreaArguments {
@@ -22,7 +28,7 @@ struct AreaArguments {
     ub2* codes;
 };
 
-// Where the next piece goes or comes from, as OCIStmtSetPieceInfo said. Used by the next execute or fetch, once.
+// Where the next piece of a value goes or comes from.
 struct PieceBuffer {
     void* buffer = nullptr;
     ub4* length = nullptr;
@@ -32,22 +38,33 @@ struct PieceBuffer {
     bool is_set = false;
 };
 
-class DataArea : public Object {
+class DataArea {
 public:
+    DataArea(Object& handle, TypeCode handle_type);
+
     // Takes over where the data are; the steps are those of plain arrays. Nothing changes when it is refused.
     Status Assign(const AreaArguments& arguments, bool in_pieces);
     // Steps of an array of structures, in bytes.
     void SetSteps(ub4 value, ub4 indicator, ub4 length, ub4 code);
+    // Whether the application could still hand the handle in.
+    [[nodiscard]] bool HasHandle() const noexcept { return live::KindOf(workspace.holder) != Kind::none; }
+    [[nodiscard]] Object* Handle() const noexcept { return Live<Object>(workspace.holder); }
+    [[nodiscard]] TypeCode HandleType() const { return handle_type_; }
 
-    [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
+    // The statement that the area belongs to; null: none.
+    [[nodiscard]] std::shared_ptr<StatementShare> Owner() const;
+    void SetOwner(std::shared_ptr<StatementShare> owner) noexcept;
+    // It no longer belongs to this one, which goes; nothing when it belongs to another.
+    void Leave(const StatementShare* owner) noexcept;
+
     [[nodiscard]] const values::ExternalType* Type() const { return type_; }
     [[nodiscard]] bool InPieces() const { return in_pieces_; }
+    Status UseCharacterSet(std::uint16_t id);
 
     values::Elements elements;
     values::Workspace workspace;
-    PieceBuffer piece;
+    PieceBuffer piece;              // as OCIStmtSetPieceInfo said; used by the next execute or fetch, once
     std::uint32_t position = 0;     // from 1; of the placeholder or column
-    Statement* statement = nullptr;
 
     // Attributes that are kept.
     std::uint16_t character_set = 0;    // 0: the environment's
@@ -55,12 +72,28 @@ public:
     std::int32_t most_bytes = 0;
     std::int32_t most_characters = 0;
     std::uint32_t character_count = 0;
-    void UseCharacterSet(std::uint16_t id);
-
-protected:
-    explicit DataArea(const Origin& origin);
 
 private:
+    const TypeCode handle_type_;
     const values::ExternalType* type_ = nullptr;
     bool in_pieces_ = false;
+    mutable std::mutex owner_mutex_;
+    std::shared_ptr<StatementShare> owner_;
+};
+
+// Takes an area out of its statement's hands; a handle that the statement made goes with it, one that the application
+// allocated itself is only let loose.
+void ReleaseArea(DataArea& area, const Object& statement) noexcept;
+
+// A handle with its area.
+template <class Area>
+class AreaHandle : public Object {
+public:
+    explicit AreaHandle(const Origin& origin) : Object(origin), area(std::make_shared<Area>(*this, origin.type)) {}
+    ~AreaHandle() override { area->workspace.holder = nullptr; }
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override {
+        const std::shared_ptr<StatementShare> owner = area->Owner();
+        return owner ? owner->Serial() : nullptr;
+    }
+    const std::shared_ptr<Area> area;
 };

@@ -3,10 +3,9 @@
 
 #include "statements/data_area.h"
 
-class Define : public DataArea {
+class Define final : public AreaHandle<DataArea> {
 public:
     static constexpr Kind kKind = Kind::define;
-    explicit Define(const Origin& origin) : DataArea(origin) {}
-    ~Define() override;
+    using AreaHandle::AreaHandle;
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
 };

@@ -1,10 +1,10 @@
-// Statements: running them. Row numbers are those of the bound arrays.
+// Statements: running them. Row numbers are those of the bound arrays. Transactions begin and end in the engine: a
+// statement only says what it does.
 #include <algorithm>
 #include <utility>
 
 #include "handles/errors.h"
-#include "sessions/service_context.h"
-#include "statements/rows.h"
+#include "sessions/link.h"
 #include "statements/statement.h"
 
 namespace {
@@ -29,75 +29,104 @@ Status CheckOnce(const ExecuteArguments& arguments) {
     return CheckRange(arguments);
 }
 
+engine::Effect EffectOf(const sql::Step& step) {
+    switch (step.run) {
+        case sql::Run::query:
+        case sql::Run::open_cursor:
+        case sql::Run::assign: return step.locks_rows ? engine::Effect::locks : engine::Effect::reads;
+        case sql::Run::change: return engine::Effect::changes;
+        case sql::Run::definition: return engine::Effect::defines;
+        default: return engine::Effect::controls;
+    }
+}
+
+// Whether the engine compiles the step; the others are calls on the connection.
+bool IsForEngine(const sql::Step& step) {
+    return step.run != sql::Run::commit && step.run != sql::Run::rollback && step.run != sql::Run::begin &&
+           step.run != sql::Run::nothing;
+}
+
 }  // namespace
 
-Status Statement::Execute(ServiceContext& service, ErrorHandle& error, const ExecuteArguments& arguments) {
-    if (pieces_.kind == Pieces::Kind::execute) return ContinueExecute(error);
-    if (pieces_.kind == Pieces::Kind::fetch && pieces_.by_execute) return ContinueFetch();
-    if (Status status = Ready(service, arguments); !status.Ok()) return status;
+Status Statement::Execute(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
+    return WithNotices(error, ExecuteNow(target, error, arguments));
+}
+
+Status Statement::ExecuteNow(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
+    const PieceStream::Use wants = pieces_.Wants();
+    if (wants == PieceStream::Use::execute) return ContinueExecute(error);
+    if (wants == PieceStream::Use::fetch_by_execute) return ContinueFetch();
+    if (Status status = Ready(target, arguments); !status.Ok()) return status;
     error.row_failures.clear();
     error.row_offset = 0;
     if (arguments.mode & OCI_PARSE_ONLY) return ParseOnly();
     if (arguments.mode & OCI_DESCRIBE_ONLY) return DescribeOnly();
-
-    CloseCursor();
-    state_ = State::initialized;
-    row_count_ = 0;
-    rows_fetched_ = failed_rows_ = 0;
-    last_row_ = 0;
-    cancelled_ = false;
-    failed_ = true;
-    const bool in_pieces = std::any_of(bound_.begin(), bound_.end(),
-                                       [](const Bind* bind) { return bind && bind->InPieces(); });
-    if (in_pieces) return StartExecuteInPieces(arguments);
-    return Run(error, arguments);
+    StartAnew();
+    run_.fetch_error = errors::kNoDefines;    // unless it succeeds
+    return text_.AnyInPieces() ? StartExecuteInPieces(error, arguments) : Run(error, arguments);
 }
 
 // Checks the arguments, joins the link and answers what the text itself tells to be wrong.
-Status Statement::Ready(ServiceContext& service, const ExecuteArguments& arguments) {
-    pieces_ = {};
-    if (!prepared_) return Error(errors::kNotPrepared);
+Status Statement::Ready(const ExecuteTarget& target, const ExecuteArguments& arguments) {
+    pieces_.End();
+    if (!text_.IsSet()) return Error(errors::kNotPrepared);
     if (Status status = CheckMode(arguments.mode); !status.Ok()) return status;
-    std::shared_ptr<Link> link;
-    if (Status status = service.Require(link); !status.Ok()) return status;
-    if (link != UsedLink()) {
+    if (!target.link) return target.status;
+    if (target.link != UsedLink()) {
         Drop();
-        Use(std::move(link));
+        Use(target.link);
     }
-    link_lost_ = false;
-    defines_changed_ = true;
-    parse_error_offset_ = scanned_.error_offset;
-    if (scanned_.error == 0) return {};
-    failed_ = true;
-    return Error(scanned_.error);
+    if (run_.fetch_error == errors::kNotConnected) run_.fetch_error = errors::kNotExecuted;
+    parse_error_offset_ = Scanned().error_offset;
+    if (Scanned().error == 0) return {};
+    StartAnew();
+    run_.fetch_error = errors::kNoDefines;
+    return Error(Scanned().error);
 }
 
+// An engine that needs the kinds of its parameters compiles anew when they are others.
 Status Statement::Compile(std::size_t index, Compiled*& compiled) {
-    compiled_.resize(scanned_.steps.size());
+    compiled_.resize(Scanned().steps.size());
     compiled = &compiled_[index];
-    if (compiled->query) return {};
-    compiled->text = sql::Rewrite(text_, scanned_, scanned_.steps[index], Engine().GetDialect());
+    engine::Database& database = UsedLink()->Database();
+    const bool typed = database.GetCapabilities().typed_parameters;
+    if (compiled->query && !typed) return {};
+    if (!compiled->rewritten) {
+        compiled->text = sql::Rewrite(text_.Text(), Scanned(), Scanned().steps[index], database.GetDialect());
+        compiled->rewritten = true;
+    }
+    std::vector<engine::Kind> kinds;
+    KindsOf(text_, compiled->text, kinds);
+    if (compiled->query && kinds == compiled->kinds) return {};
+    compiled->query.reset();
+    compiled->kinds = std::move(kinds);
+    if (typed) compiled->rows.WidenTo(compiled->kinds);
     std::uint32_t offset = 0;
-    Status status = Engine().Prepare(compiled->text.sql, compiled->query, offset);
+    Status status = Engine().Compile({compiled->text.sql, EffectOf(Scanned().steps[index]), compiled->kinds},
+                                     compiled->query, offset);
     if (!status.Ok()) parse_error_offset_ = compiled->text.SourceOffset(offset);
     return status;
 }
 
+// The only step of a plain statement, with its binds.
+Status Statement::CompileForValues(Compiled*& compiled) {
+    if (Status status = Compile(0, compiled); !status.Ok()) return status;
+    if (Status status = compiled->rows.Collect(text_, compiled->text); !status.Ok()) return status;
+    return compiled->rows.HasTables() ? Error(errors::kTablesInBlocksOnly) : Status();
+}
+
 Status Statement::ParseOnly() {
-    if (state_ != State::initialized || described_) return Error(errors::kAlreadyExecuted);
-    for (std::size_t index = 0; index < scanned_.steps.size(); ++index) {
-        const sql::Run run = scanned_.steps[index].run;
-        const bool for_engine = run != sql::Run::commit && run != sql::Run::rollback && run != sql::Run::begin &&
-                                run != sql::Run::nothing;
+    if (run_.state != Execution::State::initialized || described_) return Error(errors::kAlreadyExecuted);
+    for (std::size_t index = 0; index < Scanned().steps.size(); ++index) {
         Compiled* compiled = nullptr;
-        if (!for_engine) continue;
+        if (!IsForEngine(Scanned().steps[index])) continue;
         if (Status status = Compile(index, compiled); !status.Ok()) return status;
     }
     return {};
 }
 
 Status Statement::DescribeOnly() {
-    if (scanned_.type != sql::StatementType::select) return {};
+    if (Scanned().type != sql::StatementType::select) return {};
     Compiled* compiled = nullptr;
     Status status = Compile(0, compiled);
     described_ = status.Ok();
@@ -106,8 +135,8 @@ Status Statement::DescribeOnly() {
 
 Status Statement::Run(ErrorHandle& error, const ExecuteArguments& arguments) {
     const auto run = [&] {
-        if (scanned_.is_block) return RunBlock(arguments);
-        switch (scanned_.steps[0].run) {
+        if (Scanned().is_block) return RunBlock(arguments);
+        switch (Scanned().steps[0].run) {
             case sql::Run::query: return RunQuery(arguments);
             case sql::Run::change: return RunChange(error, arguments);
             case sql::Run::begin:
@@ -122,53 +151,62 @@ Status Statement::Run(ErrorHandle& error, const ExecuteArguments& arguments) {
 // Notes how an execute went, and commits if it is asked to.
 Status Statement::Complete(Status status, const ExecuteArguments& arguments) {
     if (status.Failed()) return status;
-    failed_ = false;
-    if (state_ == State::initialized) state_ = State::executed;
-    if (!(arguments.mode & OCI_COMMIT_ON_SUCCESS) || pieces_.kind != Pieces::Kind::none) return status;
+    run_.fetch_error = 0;
+    if (run_.state == Execution::State::initialized) run_.state = Execution::State::executed;
+    if (!(arguments.mode & OCI_COMMIT_ON_SUCCESS) || pieces_.Wants() != PieceStream::Use::none) return status;
     Status committed = Engine().Commit();
     return committed.Ok() ? status : committed;
+}
+
+// What the engine had to say besides makes success one with information. After a failure its error says enough; an
+// operation that goes on keeps it for its end.
+Status Statement::WithNotices(ErrorHandle& error, Status status) {
+    const std::shared_ptr<Link>& link = UsedLink();
+    if (!link || link->Closed()) return status;
+    link->Answered(status);
+    if (!link->Engine().HasNotices() || status.Code() == OCI_NEED_DATA) return status;
+    std::vector<Status> notices = link->Engine().TakeNotices();
+    if (status.Code() != OCI_SUCCESS && status.Code() != OCI_SUCCESS_WITH_INFO) return status;
+    if (!status.Ok()) error.list.Add(status);
+    for (std::size_t index = 0; index + 1 < notices.size(); ++index) error.list.Add(notices[index]);
+    return std::move(notices.back());
 }
 
 // ---- Queries
 
 Status Statement::RunQuery(const ExecuteArguments& arguments) {
     Compiled* compiled = nullptr;
-    Rows rows;
-    if (Status status = Compile(0, compiled); !status.Ok()) return status;
-    if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
-    if (rows.HasTables()) return Error(errors::kTablesInBlocksOnly);
+    if (Status status = CompileForValues(compiled); !status.Ok()) return status;
     const bool was_described = std::exchange(described_, true);
     if (arguments.iterations > 0) {
         if (Status status = CheckRange(arguments); !status.Ok()) return status;
-        if (Status status = ActivateDefines(); !status.Ok()) return status;
+        if (Status status = defines_.Activate(compiled->query->Columns()); !status.Ok()) return status;
     }
-    if (scanned_.steps[0].locks_rows || scanned_.steps[0].run == sql::Run::change) {
-        if (Status status = Engine().Begin(); !status.Ok()) return status;
-    }
-    if (Status status = compiled->query->Open(rows, 0); !status.Ok()) {
+    const bool scrollable = arguments.mode & OCI_STMT_SCROLLABLE_READONLY;
+    if (Status status = compiled->query->Open(compiled->rows, {0, scrollable, prefetch_rows}); !status.Ok()) {
         described_ = was_described;
         return status;
     }
-    cursor_.Open(*compiled->query, arguments.mode & OCI_STMT_SCROLLABLE_READONLY);
+    run_.cursor.Open(*compiled->query, scrollable);
     ++UsedLink()->open_statements;
-    defines_changed_ = true;    // the first row may have told more of the columns
-    state_ = State::executed;
+    defines_.Renew();    // the first row may have told more of the columns
+    run_.state = Execution::State::executed;
     return arguments.iterations > 0 ? FetchAtExecute(arguments) : Status();
 }
 
 // The rows that the execute itself delivers; elements count from the row offset. An exact fetch looks one row further.
 Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     const ub4 rows = arguments.iterations - arguments.first;
-    if (Status status = ActivateDefines(); !status.Ok()) return status;
-    if (fetches_in_pieces_) return StartFetchInPieces(rows, false, true);
-    Status status = FetchRows(rows, arguments.first, false);
+    if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) return status;
+    if (defines_.InPieces()) return StartFetchInPieces(rows, nullptr, true);
+    Status status = FetchRows(rows, arguments.first, nullptr);
     if (!(arguments.mode & OCI_EXACT_FETCH)) return status;
     bool more = false;
     if (!status.Failed() && status.Code() != OCI_NO_DATA) {
-        if (Status next = cursor_.Next(more); !next.Ok()) status = std::move(next);
+        if (Status next = run_.cursor.AnyMore(more); !next.Ok()) status = std::move(next);
     }
     CloseCursor();
-    state_ = State::end_of_fetch;
+    run_.state = Execution::State::end_of_fetch;
     return more ? Error(errors::kTooManyRows) : status;
 }
 
@@ -183,67 +221,39 @@ Status Statement::RunChange(ErrorHandle& error, const ExecuteArguments& argument
 
 // Runs the rows [first, iterations) and adds what they did.
 Status Statement::RunRows(const ExecuteArguments& arguments, engine::ArrayOutcome& outcome) {
-    const sql::Step& step = scanned_.steps[0];
+    const sql::Step& step = Scanned().steps[0];
     Compiled* compiled = nullptr;
-    Rows rows;
-    if (Status status = Compile(0, compiled); !status.Ok()) return status;
-    if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
-    if (rows.HasTables()) return Error(errors::kTablesInBlocksOnly);
-    if (Status status = Engine().Begin(); !status.Ok()) return status;
-    const bool all_rows = arguments.mode & OCI_BATCH_ERRORS;
-    if (compiled->query->Columns().empty())
-        return compiled->query->ExecuteArray(rows, arguments.first, arguments.iterations, all_rows, outcome);
-    for (ub4 row = arguments.first; row < arguments.iterations; ++row) {
-        Status status = ReturnRow(*compiled, rows, step, row, outcome.affected);
-        if (!status.Ok() && !Engine().InTransaction()) return status;
-        if (status.Ok()) ++outcome.executed;
-        else outcome.failures.push_back({row, std::move(status)});
-        if (!outcome.failures.empty() && !all_rows) break;
+    if (Status status = CompileForValues(compiled); !status.Ok()) return status;
+    engine::ArrayRun run{arguments.first, arguments.iterations, (arguments.mode & OCI_BATCH_ERRORS) != 0, nullptr};
+    if (compiled->query->Columns().empty()) return compiled->query->ExecuteArray(compiled->rows, run, outcome);
+    SetReturned(step, 0);
+    Targets targets(text_, step, *compiled->query, Targets::Layout::each_execution);
+    run.returned = &targets;
+    const std::uint32_t done_before = outcome.executed;
+    Status status = compiled->query->ExecuteArray(compiled->rows, run, outcome);
+    if (status.Ok() && outcome.executed > done_before) {
+        // The last execution that succeeded: failures behind it are those of the rows at the end.
+        ub4 last = run.all_rows || outcome.failures.empty() ? arguments.iterations : outcome.failures.back().row;
+        for (auto failure = outcome.failures.rbegin(); failure != outcome.failures.rend(); ++failure)
+            if (failure->row + 1 == last) last = failure->row;
+        SetReturned(step, targets.RowsOf(last - 1));
     }
-    return {};
+    return status;
 }
 
-// One execution of a change that gives rows back; the last one stays in the targets' element.
-Status Statement::ReturnRow(Compiled& compiled, Rows& rows, const sql::Step& step, ub4 row, std::uint64_t& count) {
-    if (Status status = compiled.query->Open(rows, row); !status.Ok()) return status;
-    std::vector<engine::Datum> values(compiled.query->Columns().size());
-    std::uint32_t returned = 0;
-    for (bool more = true;;) {
-        Status status = compiled.query->Fetch(values, more);
-        if (status.Ok() && !more) break;
-        if (status.Ok()) status = StoreTargets(step, *compiled.query, values, row);
-        if (!status.Ok()) {
-            compiled.query->Close();
-            return status;
-        }
-        ++returned;
-    }
+// Of the statement's binds that take what it gives back, how many rows they got.
+void Statement::SetReturned(const sql::Step& step, std::uint32_t rows) {
     for (const std::uint32_t target : step.targets)
-        if (Bind* bind = bound_[target]) bind->rows_returned = returned;
-    count += returned;
-    return {};
+        if (text_.IsBound(target)) text_.At(target)->rows_returned = rows;
 }
 
-// Puts a row into the binds of a step's targets.
-Status Statement::StoreTargets(const sql::Step& step, engine::Query& query, std::span<const engine::Datum> row,
-                               std::size_t index) {
-    const std::size_t count = std::min(step.targets.size(), row.size());
-    for (std::size_t target = 0; target < count; ++target) {
-        Bind* bind = bound_[step.targets[target]];
-        if (!bind) return Error(errors::kNotAllBound);
-        bind->workspace.column = values::ClassOf(query.Columns()[target].type);
-        const auto converters = values::ForColumn(*bind->Type()->out, bind->workspace.column);
-        const int error = values::Store(bind->elements, index, converters, bind->workspace, row[target]);
-        if (error != 0 && error != errors::kTruncationWarning) return Error(error);
-    }
-    return {};
-}
-
+// What an array execute did shows whatever goes wrong in telling it.
 Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments, engine::ArrayOutcome& outcome) {
-    row_count_ = outcome.affected;
-    last_row_ = Engine().LastRowNumber();
-    failed_rows_ = static_cast<std::uint32_t>(outcome.failures.size());
+    run_.row_count = outcome.affected;
+    run_.last_row = outcome.last_row;
+    run_.failed_rows = static_cast<std::uint32_t>(outcome.failures.size());
     if (outcome.failures.empty()) return {};
+    for (const auto& failure : outcome.failures) UsedLink()->Answered(failure.status);
     if (!(arguments.mode & OCI_BATCH_ERRORS)) {
         error.row_offset = outcome.failures.front().row;
         return std::move(outcome.failures.front().status);
@@ -256,28 +266,27 @@ Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments, 
 
 // Definitions, savepoints and what only the engine knows; the last may turn out to return rows.
 Status Statement::RunOnce(const ExecuteArguments& arguments) {
-    const sql::Run run = scanned_.steps[0].run;
+    const sql::Run run = Scanned().steps[0].run;
     const bool is_definition = run == sql::Run::definition;
-    if (is_definition && !scanned_.placeholders.empty()) return Error(errors::kBindsInDefinition);
+    if (is_definition && !Scanned().placeholders.empty()) return Error(errors::kBindsInDefinition);
     Compiled* compiled = nullptr;
-    Rows rows;
     if (Status status = Compile(0, compiled); !status.Ok()) return status;
     if (!compiled->query->Columns().empty() && !is_definition) return RunQuery(arguments);
     if (Status status = CheckOnce(arguments); !status.Ok()) return status;
-    if (Status status = rows.Collect(*this, *compiled); !status.Ok()) return status;
-    if (run == sql::Run::savepoint || is_definition) {
-        if (Status status = is_definition ? Engine().Commit() : Engine().Begin(); !status.Ok()) return status;
+    if (Status status = CompileForValues(compiled); !status.Ok()) return status;
+    if (run == sql::Run::savepoint) {    // one outside of a transaction would be one
+        if (Status status = Engine().Begin(engine::TransactionMode::read_write); !status.Ok()) return status;
     }
     engine::ArrayOutcome outcome;
-    if (Status status = compiled->query->ExecuteArray(rows, 0, 1, false, outcome); status.Failed()) return status;
-    if (!outcome.failures.empty()) return std::move(outcome.failures.front().status);
-    return is_definition ? Engine().Commit() : Status();
+    Status status = compiled->query->ExecuteArray(compiled->rows, {}, outcome);
+    if (status.Ok() && !outcome.failures.empty()) return std::move(outcome.failures.front().status);
+    return status;
 }
 
 Status Statement::RunControl(const ExecuteArguments& arguments) {
     if (Status status = CheckOnce(arguments); !status.Ok()) return status;
-    switch (scanned_.steps[0].run) {
-        case sql::Run::begin: return Engine().Begin();
+    switch (Scanned().steps[0].run) {
+        case sql::Run::begin: return Engine().Begin(engine::TransactionMode::read_write);
         case sql::Run::commit: return Engine().Commit();
         default: return Engine().Rollback();
     }

@@ -1,130 +1,94 @@
 // Statements: fetching rows into the defines.
 #include "handles/errors.h"
 #include "sessions/link.h"
-#include "statements/statement.h"
+#include "statements/fetch_sink.h"
 
 const std::vector<engine::Column>* Statement::Columns() {
-    if (cursor_.IsOpen()) return &cursor_.Columns();
+    if (run_.cursor.IsOpen()) return &run_.cursor.Columns();
     if (!described_ || compiled_.empty() || !compiled_[0].query) return nullptr;
     return &compiled_[0].query->Columns();
 }
 
 Status Statement::CheckFetch() const {
-    if (pieces_.kind == Pieces::Kind::execute) return Error(errors::kOperationActive);
-    if (link_lost_) return Error(errors::kNotConnected);
-    if (cancelled_) return Error(errors::kFetchOutOfSequence);
-    if (failed_) return Error(errors::kNoDefines);
-    if (state_ == State::initialized) return Error(errors::kNotExecuted);
-    return cursor_.IsOpen() ? Status() : Error(errors::kFetchOutOfSequence);
+    if (pieces_.Wants() == PieceStream::Use::execute) return Error(errors::kOperationActive);
+    if (run_.fetch_error != 0) return Error(run_.fetch_error);
+    return run_.cursor.IsOpen() ? Status() : Error(errors::kFetchOutOfSequence);
 }
 
-Status Statement::Fetch(ub4 rows, ub2 orientation, sb4 offset) {
-    if (pieces_.kind == Pieces::Kind::fetch) return ContinueFetch();
-    rows_fetched_ = 0;
+Status Statement::Fetch(ErrorHandle& error, ub4 rows, ub2 orientation, sb4 offset) {
+    return WithNotices(error, FetchNow(rows, orientation, offset));
+}
+
+Status Statement::FetchNow(ub4 rows, ub2 orientation, sb4 offset) {
+    const PieceStream::Use wants = pieces_.Wants();
+    if (wants == PieceStream::Use::fetch || wants == PieceStream::Use::fetch_by_execute) return ContinueFetch();
+    run_.rows_fetched = 0;
     if (Status status = CheckFetch(); !status.Ok()) return status;
     if (rows == 0) {
         CloseCursor();
-        cancelled_ = true;
+        run_.fetch_error = errors::kFetchOutOfSequence;
         return {};
     }
-    if (Status status = ActivateDefines(); !status.Ok()) return status;
-    bool at_first = false;
-    if (cursor_.Scrollable()) {
-        if (Status status = GoToFirst(orientation, offset, at_first); !status.Ok()) return status;
-        if (!at_first) return EndOfFetch();
+    if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) return status;
+    std::uint64_t first = 0;
+    const std::uint64_t* position = nullptr;
+    if (run_.cursor.Scrollable()) {
+        if (Status status = FindFirst(orientation, offset, first); !status.Ok()) return status;
+        position = &first;
     } else if (orientation != OCI_DEFAULT && orientation != OCI_FETCH_NEXT) {
         return Error(errors::kBadFetch);
     }
-    return fetches_in_pieces_ ? StartFetchInPieces(rows, at_first, false) : FetchRows(rows, 0, at_first);
+    return defines_.InPieces() ? StartFetchInPieces(rows, position, false) : FetchRows(rows, 0, position);
 }
 
-// Moves a scrollable cursor to the first row that is wanted.
-Status Statement::GoToFirst(ub2 orientation, sb4 offset, bool& found) {
-    const auto position = static_cast<std::int64_t>(cursor_.Position());
+// The position of the first row that is wanted of a scrollable cursor; 0 is before them.
+Status Statement::FindFirst(ub2 orientation, sb4 offset, std::uint64_t& position) {
+    const auto here = static_cast<std::int64_t>(run_.cursor.Position());
     std::int64_t target = 0;
     switch (orientation) {
         case OCI_DEFAULT:
-        case OCI_FETCH_NEXT: target = position + 1; break;
-        case OCI_FETCH_CURRENT: target = position; break;
-        case OCI_FETCH_PRIOR: target = position - 1; break;
+        case OCI_FETCH_NEXT: target = here + 1; break;
+        case OCI_FETCH_CURRENT: target = here; break;
+        case OCI_FETCH_PRIOR: target = here - 1; break;
         case OCI_FETCH_FIRST: target = 1; break;
-        case OCI_FETCH_RELATIVE: target = position + offset; break;
+        case OCI_FETCH_RELATIVE: target = here + offset; break;
         case OCI_FETCH_ABSOLUTE:
             if (offset < 0) return Error(errors::kBadScroll);
             target = offset;
             break;
-        case OCI_FETCH_LAST: {
-            std::uint64_t count = 0;
-            if (Status status = cursor_.Count(count); !status.Ok()) return status;
-            target = static_cast<std::int64_t>(count);
-            break;
-        }
+        case OCI_FETCH_LAST: return run_.cursor.Count(position);
         default: return Error(errors::kBadFetch);
     }
-    return cursor_.GoTo(target > 0 ? static_cast<std::uint64_t>(target) : 0, found);
-}
-
-// Finds the column of each define and what converts its values.
-Status Statement::ActivateDefines() {
-    if (!defines_changed_) return {};
-    active_.clear();
-    fetches_in_pieces_ = false;
-    const std::vector<engine::Column>& columns = *Columns();
-    for (std::uint32_t index = 0; index < defined_.size(); ++index) {
-        Define* define = defined_[index];
-        if (!define) continue;
-        if (index >= columns.size()) return Error(errors::kNoSuchColumn);
-        define->workspace.column = values::ClassOf(columns[index].type);
-        const values::ExternalType& type = *define->Type();
-        ActiveDefine& active = active_.emplace_back(ActiveDefine{define, index, {}, {}});
-        active.converters = values::ForColumn(*type.out, define->workspace.column);
-        if (define->InPieces()) active.renderers = values::ForColumn(*type.pieces, define->workspace.column);
-        fetches_in_pieces_ |= define->InPieces();
-    }
-    if (active_.empty()) return Error(errors::kNoDefines);
-    defines_changed_ = false;
+    position = target > 0 ? static_cast<std::uint64_t>(target) : 0;
     return {};
 }
 
-// Up to `rows` rows into the elements from `first` on. `at_first`: the cursor stands on the first of them already.
-Status Statement::FetchRows(ub4 rows, ub4 first, bool at_first) {
-    Status outcome;
-    for (ub4 row = 0; row < rows; ++row) {
-        bool found = at_first && row == 0;
-        if (!found) {
-            if (Status status = cursor_.Next(found); !status.Ok()) return status;
-            if (!found) return EndOfFetch();
-        }
-        if (const int error = StoreRow(first + row)) {
-            if (error != errors::kTruncationWarning) return Error(error);
-            outcome = Warning(error);
-        }
-        ++rows_fetched_;
-    }
-    row_count_ = cursor_.Reached();
-    return outcome;
+Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> values) {
+    const int error = statement_.defines_.StoreRow(index_, values);
+    if (error != 0 && error != errors::kTruncationWarning) return Error(error);
+    if (error != 0) warning_ = Warning(error);
+    if (in_pieces_) statement_.pieces_.Begin(index_, values);
+    else ++statement_.run_.rows_fetched;
+    ++index_;
+    return {};
 }
 
-// All columns of the row at hand; answers the gravest thing that happened: an error before a warning.
-int Statement::StoreRow(ub4 index) {
-    const std::span<const engine::Datum> row = cursor_.Row();
-    int worst = 0;
-    for (const ActiveDefine& active : active_) {
-        if (active.define->InPieces()) continue;
-        const int error = values::Store(active.define->elements, index, active.converters, active.define->workspace,
-                                        row[active.column]);
-        if (error != 0 && (worst == 0 || worst == errors::kTruncationWarning)) worst = error;
-    }
-    return worst;
+// Up to `rows` rows into the elements from `first` on; of a scrollable cursor those from a position on.
+Status Statement::FetchRows(ub4 rows, ub4 first, const std::uint64_t* position) {
+    FetchSink sink(*this, first, false);
+    std::uint32_t delivered = 0;
+    Status status = position ? run_.cursor.ReadFrom(*position, sink, rows, delivered)
+                             : run_.cursor.Read(sink, rows, delivered);
+    if (!status.Ok()) return status;
+    if (delivered < rows) return EndOfFetch();
+    run_.row_count = run_.cursor.Reached();
+    return sink.Warned();
 }
 
 // A scrollable cursor that delivered something stays on the last row of it.
 Status Statement::EndOfFetch() {
-    bool found = false;
-    if (cursor_.Scrollable() && rows_fetched_ > 0) {
-        if (Status status = cursor_.GoTo(cursor_.Position() - 1, found); !status.Ok()) return status;
-    }
-    row_count_ = cursor_.Reached();
-    state_ = State::end_of_fetch;
+    if (run_.rows_fetched > 0) run_.cursor.StayOnLastRow();
+    run_.row_count = run_.cursor.Reached();
+    run_.state = Execution::State::end_of_fetch;
     return NoData();
 }

@@ -4,8 +4,10 @@
 #include <algorithm>
 
 #include "handles/attributes.h"
+#include "handles/environment.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
+#include "statements/statement.h"
 
 namespace {
 
@@ -25,7 +27,11 @@ std::uint64_t Size(const Parameter& parameter) {
 }
 
 Status Name(Parameter& parameter, AttributeValue& value) {
-    value.text = parameter.column.name;
+    if (!parameter.statement) return {};
+    const Environment& environment = parameter.Env();
+    std::string converted;
+    value.text = parameter.statement->KeepName(TextOut(environment, parameter.column.name, converted));
+    value.converted = environment.Utf16();
     return {};
 }
 Status NoText(Parameter&, AttributeValue&) { return {}; }
@@ -89,6 +95,11 @@ Status CharacterForm(Parameter& parameter, AttributeValue& value) {
     return {};
 }
 
+Status Position(Parameter& parameter, AttributeValue& value) {
+    value.integer = parameter.position;
+    return {};
+}
+
 template <Status (*function)(Parameter&, AttributeValue&)>
 constexpr auto kGet = Get<Parameter, function>;
 
@@ -102,7 +113,7 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_IS_NULL, Shape::ub1, kGet<IsNullable>, nullptr},
     {OCI_ATTR_TYPE_NAME, Shape::text, kGet<NoText>, nullptr},
     {OCI_ATTR_SCHEMA_NAME, Shape::text, kGet<NoText>, nullptr},
-    {OCI_ATTR_POSITION, Shape::ub2, GetField<&Parameter::position>, nullptr},
+    {OCI_ATTR_POSITION, Shape::ub2, kGet<Position>, nullptr},
     {OCI_ATTR_PTYPE, Shape::ub1, kGet<ParameterType>, nullptr},
     {OCI_ATTR_CHAR_USED, Shape::ub1, kGet<CountsCharacters>, nullptr},
     {OCI_ATTR_CHAR_SIZE, Shape::ub2, kGet<Characters>, nullptr},
@@ -112,11 +123,11 @@ constexpr AttributeRow kRows[] = {
 
 }  // namespace
 
-Parameter::~Parameter() { if (statement) statement->Forget(*this); }
-
 std::span<const AttributeRow> Parameter::Attributes() const { return kRows; }
 
-std::shared_ptr<std::recursive_mutex> Parameter::Serial() { return statement ? statement->Serial() : nullptr; }
+std::shared_ptr<std::recursive_mutex> Parameter::Serial() {
+    return statement ? statement->Serial() : nullptr;
+}
 
 // One descriptor a position: handed out again and brought up to date, so that asking often leaves nothing behind.
 Status Statement::GetParameter(ub4 position, dvoid** out) {
@@ -124,11 +135,11 @@ Status Statement::GetParameter(ub4 position, dvoid** out) {
     if (!columns || position == 0 || position > columns->size()) return Error(errors::kNoParameter);
     if (!out) return Error(errors::kNullArgument);
     if (parameters_.size() < position) parameters_.resize(position);
-    Parameter*& parameter = parameters_[position - 1];
-    if (!parameter) {
-        parameter = Create<Parameter>(*this, OCI_DTYPE_PARAM, 0);
-        parameter->statement = this;
-        parameter->position = position;
+    Parameter* parameter = Live<Parameter>(parameters_[position - 1]);
+    const bool is_ours = parameter && parameter->Parent() == this && parameter->position == position;
+    if (!is_ours) {    // none yet, or freed since
+        parameter = Create<Parameter>(*this, OCI_DTYPE_PARAM, 0, Share(), position);
+        parameters_[position - 1] = parameter;
     }
     parameter->column = (*columns)[position - 1];
     *out = parameter;

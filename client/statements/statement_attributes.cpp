@@ -9,28 +9,28 @@
 // Reads what the class keeps to itself.
 struct StatementAttributes {
     static Status Text(Statement& statement, AttributeValue& value) {
-        value.text = statement.text_;
+        value.text = statement.Text();
         return {};
     }
     static Status Type(Statement& statement, AttributeValue& value) {
-        const bool is_result = !statement.prepared_ && statement.HasResult();
-        value.integer = is_result ? OCI_STMT_SELECT : static_cast<std::uint16_t>(statement.scanned_.type);
+        const bool is_result = !statement.text_.IsSet() && statement.HasResult();
+        value.integer = is_result ? OCI_STMT_SELECT : static_cast<std::uint16_t>(statement.Scanned().type);
         return {};
     }
     static Status FunctionCode(Statement& statement, AttributeValue& value) {
-        value.integer = statement.scanned_.function_code;
+        value.integer = statement.Scanned().function_code;
         return {};
     }
     static Status RowCount(Statement& statement, AttributeValue& value) {
-        value.integer = statement.row_count_;
+        value.integer = statement.run_.row_count;
         return {};
     }
     static Status RowsFetched(Statement& statement, AttributeValue& value) {
-        value.integer = statement.rows_fetched_;
+        value.integer = statement.run_.rows_fetched;
         return {};
     }
     static Status FailedRows(Statement& statement, AttributeValue& value) {
-        value.integer = statement.failed_rows_;
+        value.integer = statement.run_.failed_rows;
         return {};
     }
     static Status ColumnCount(Statement& statement, AttributeValue& value) {
@@ -39,19 +39,19 @@ struct StatementAttributes {
         return {};
     }
     static Status BindCount(Statement& statement, AttributeValue& value) {
-        value.integer = statement.scanned_.positions.size();
+        value.integer = statement.Scanned().positions.size();
         return {};
     }
     static Status State(Statement& statement, AttributeValue& value) {
-        value.integer = static_cast<std::uint8_t>(statement.state_);
+        value.integer = static_cast<std::uint8_t>(statement.run_.state);
         return {};
     }
     static Status Position(Statement& statement, AttributeValue& value) {
-        value.integer = statement.cursor_.Position();
+        value.integer = statement.run_.cursor.Position();
         return {};
     }
     static Status IsReturning(Statement& statement, AttributeValue& value) {
-        value.integer = statement.scanned_.Returning();
+        value.integer = statement.Scanned().Returning();
         return {};
     }
     // Bytes of the application's text before the error.
@@ -59,15 +59,15 @@ struct StatementAttributes {
         value.integer = statement.parse_error_offset_;
         if (!statement.Env().Utf16()) return {};
         std::string units;
-        utf::ToUtf16(std::string_view(statement.text_).substr(0, statement.parse_error_offset_), units);
+        utf::ToUtf16(std::string_view(statement.Text()).substr(0, statement.parse_error_offset_), units);
         value.integer = units.size();
         return {};
     }
     static Status RowId(Statement& statement, AttributeValue& value) {
         auto* descriptor = Live<RowIdDescriptor>(value.pointer);
         if (!descriptor) return InvalidHandle();
-        if (statement.last_row_ == 0) return Error(errors::kInvalidRowId);
-        descriptor->value = rowid::RowId{0, statement.last_row_};
+        if (!statement.run_.last_row) return Error(errors::kInvalidRowId);
+        descriptor->value = rowid::FromBytes(statement.run_.last_row->bytes.data());
         return {};
     }
 };

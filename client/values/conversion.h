@@ -6,6 +6,7 @@
 #pragma once
 
 #include <array>
+#include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <string>
@@ -19,17 +20,18 @@ class Environment;
 namespace values {
 
 // What a select-list column holds, as far as its values convert in their own way.
-enum class ColumnClass : std::uint8_t { plain, number, binary_float, date, timestamp, timestamp_zone };
+enum class ColumnClass : std::uint8_t { plain, number, binary_float, binary_double, date, timestamp, timestamp_zone };
 ColumnClass ClassOf(std::uint16_t internal_type);
 
 // Settings of one bind or define, and the room in which its values are put together.
 struct Workspace {
     Environment* environment = nullptr;
-    bool utf16 = false;                 // character data of the application is UTF-16
+    std::atomic<const void*> holder{nullptr};    // the bind or define handle; null once it is gone
+    bool utf16 = false;                 // character data of the application is UTF-16; else UTF-8
     ColumnClass column = ColumnClass::plain;
     std::uint8_t precision = 0;         // of packed decimals; 0: as many digits as the area holds
     std::int8_t scale = 0;
-    std::array<char, 128> small{};     // numbers, dates, row ids
+    alignas(8) std::array<char, 128> small{};    // numbers, dates, row ids
     std::string text;                   // converted texts and bytes
     std::string units;                  // text as UTF-16
 };
@@ -56,13 +58,15 @@ using InConverter = int (*)(const Source& source, Workspace& workspace, engine::
 // A whole value in the form that is handed out in pieces.
 using Renderer = int (*)(const engine::Datum& datum, Workspace& workspace, std::string_view& whole);
 
-// What stands behind a Datum: its kind, a number that arrives as text, or a real of a binary column. Other reals stand
-// for numbers.
-constexpr std::size_t kKinds = static_cast<std::size_t>(engine::Kind::cursor) + 1;
+// What stands behind a Datum: its kind; or a number that arrives as text, a real of a binary column of either width
+// (other reals stand for numbers), a text in a column of dates.
+constexpr std::size_t kKinds = engine::kKinds;
 constexpr std::size_t kNumberText = kKinds;
 constexpr std::size_t kBinaryReal = kKinds + 1;
+constexpr std::size_t kSingleReal = kKinds + 2;
+constexpr std::size_t kDateText = kKinds + 3;
 template <class Function>
-using ByOrigin = std::array<Function, kKinds + 2>;
+using ByOrigin = std::array<Function, kKinds + 4>;
 // By the kind of Datum, for one column.
 template <class Function>
 using ByKind = std::array<Function, kKinds>;
@@ -80,11 +84,18 @@ struct ExternalType {
     const ByOrigin<Renderer>* pieces;    // null unless in_pieces
 };
 
-// Null for a code that the library does not know.
-const ExternalType* FindType(std::uint16_t code);
+// A type code and an area size as the application gives them. `area` is how large an element counts. 3115 for a code
+// that the library does not know (`type` is left alone), 1459 or 1483 for a size that the type cannot have.
+// `may_be_null`: numbers and dates without any size are nulls, as binds take them.
+int FindType(std::uint16_t code, std::int64_t size, bool may_be_null, const ExternalType*& type, std::uint32_t& area);
 
-// Whether an area of `size` bytes can hold the type, and how large it counts.
-int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area);
+// The kind of Datum that an element becomes when it is read, unless it is null. Whole numbers that fit arrive as
+// integers even where this says decimal; Widen makes them decimals for engines that are told kinds beforehand.
+engine::Kind KindOf(const ExternalType& type, std::uint32_t size);
+void Widen(engine::Datum& datum, Workspace& workspace);
+
+// Whether the library converts character data of a character set: 0 is the environment's.
+bool KnowsCharacterSet(std::uint16_t id);
 
 // The row of a table that serves a column.
 template <class Function>
@@ -97,11 +108,12 @@ ByKind<Function> ForColumn(const ByOrigin<Function>& row, ColumnClass column) {
     switch (column) {
         case ColumnClass::plain: break;
         case ColumnClass::number: set(engine::Kind::text, kNumberText); break;
-        case ColumnClass::binary_float: set(engine::Kind::real, kBinaryReal); break;
+        case ColumnClass::binary_float: set(engine::Kind::real, kSingleReal); break;
+        case ColumnClass::binary_double: set(engine::Kind::real, kBinaryReal); break;
         case ColumnClass::date:
         case ColumnClass::timestamp:
         case ColumnClass::timestamp_zone:
-            set(engine::Kind::text, static_cast<std::size_t>(engine::Kind::timestamp));
+            set(engine::Kind::text, kDateText);
             break;
     }
     return functions;
@@ -112,10 +124,18 @@ ByKind<Function> ForColumn(const ByOrigin<Function>& row, ColumnClass column) {
 int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter>& converters, Workspace& workspace,
           const engine::Datum& datum);
 
+// A value of a single-precision column with the digits that tell it from others of that width; what needs double
+// precision stays as it is.
+double SingleByDigits(double value);
+
 // An error of the number package as that of a conversion.
 int AsConversionError(int error);
 
 // UTF-8 in the application's form: itself, or UTF-16 in the workspace.
+// What stands for the number of an error when the application has freed the bind or define in mid-call, from a memory
+// function: its memory is not touched any more.
+constexpr int kPlaceGone = -1;
+
 int ToApplication(std::string_view utf8, Workspace& workspace, std::string_view& text);
 
 // Reads one element.

@@ -1,5 +1,7 @@
 // The external types, one row a code, and the laying of a value into an element with its indicator, length and return
 // code.
+#include <algorithm>
+#include <iterator>
 #include <limits>
 
 #include "handles/errors.h"
@@ -12,7 +14,8 @@ namespace {
 
 constexpr std::uint8_t kPointer = sizeof(void*);
 
-// Codes 97, 21 and 22 are forms of this system's own: characters behind a 2-byte count, and decimal floating point.
+// Codes 97, 21 and 22 are forms of this system's own: characters behind a 2-byte count, and decimal floating point. In
+// an area of just their size, 21 and 22 are the machine's float and double.
 const ExternalType kTypes[] = {
     {SQLT_CHR, Family::text, 0, true, false, FromChr, &kToChr, &kWholeText},
     {SQLT_NUM, Family::number, OCI_NUMBER_SIZE, false, false, FromNum, &kToNum, nullptr},
@@ -52,6 +55,38 @@ const ExternalType kTypes[] = {
     {SQLT_TIMESTAMP_LTZ, Family::date, kPointer, false, true, FromDatetime, &kToDatetime, nullptr},
 };
 
+constexpr ExternalType kMachineFloat{SQLT_BFLOAT, Family::real, 4, false, false, FromFlt, &kToFlt, nullptr};
+constexpr ExternalType kMachineDouble{SQLT_BDOUBLE, Family::real, 8, false, false, FromFlt, &kToFlt, nullptr};
+
+// What an area of no size stands for: null going in, no place for a value coming out.
+constexpr ExternalType kWithoutSize[] = {
+    {SQLT_INT, Family::integer, 0, false, false, FromNull, &kToNothing, nullptr},
+    {SQLT_UIN, Family::integer, 0, false, false, FromNull, &kToNothing, nullptr},
+    {SQLT_FLT, Family::real, 0, false, false, FromNull, &kToNothing, nullptr},
+    {SQLT_VNU, Family::number, 0, false, false, FromNull, &kToNothing, nullptr},
+    {SQLT_DAT, Family::date, 0, false, false, FromNull, &kToNothing, nullptr},
+    {SQLT_ODT, Family::date, 0, false, false, FromNull, &kToNothing, nullptr},
+};
+
+template <std::size_t count>
+const ExternalType* FindCode(const ExternalType (&types)[count], std::uint16_t code) {
+    const auto* found = std::find_if(std::begin(types), std::end(types),
+                                     [code](const ExternalType& type) { return type.code == code; });
+    return found == std::end(types) ? nullptr : found;
+}
+
+// Numbers and dates of fixed form may lie in a larger area; integers and reals fill theirs; pointers need no size.
+int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area) {
+    if (type.is_pointer && size <= 0) size = kPointer;
+    const bool variable = !type.is_pointer && (type.family == Family::text || type.family == Family::bytes);
+    if (size < type.least_size) return variable ? errors::kBadAreaLength : errors::kBadFixedLength;
+    const bool power_of_two = (size & (size - 1)) == 0;
+    if (type.family == Family::integer && (size > 8 || !power_of_two)) return errors::kBadFixedLength;
+    if (type.family == Family::real && (size > 16 || !power_of_two)) return errors::kBadFixedLength;
+    area = static_cast<std::uint32_t>(size);
+    return 0;
+}
+
 int StoreNull(const Elements& elements, std::size_t index) {
     elements.SetIndicator(index, kNullIndicator);
     elements.SetLength(index, 0);
@@ -76,8 +111,8 @@ ColumnClass ClassOf(std::uint16_t internal_type) {
         case SQLT_VNU:
         case SQLT_BFLOAT:
         case SQLT_BDOUBLE: return ColumnClass::number;
-        case SQLT_IBFLOAT:
-        case SQLT_IBDOUBLE: return ColumnClass::binary_float;
+        case SQLT_IBFLOAT: return ColumnClass::binary_float;
+        case SQLT_IBDOUBLE: return ColumnClass::binary_double;
         case SQLT_DAT:
         case SQLT_DATE: return ColumnClass::date;
         case SQLT_TIMESTAMP:
@@ -89,22 +124,37 @@ ColumnClass ClassOf(std::uint16_t internal_type) {
     }
 }
 
-const ExternalType* FindType(std::uint16_t code) {
-    for (const ExternalType& type : kTypes)
-        if (type.code == code) return &type;
-    return nullptr;
+int FindType(std::uint16_t code, std::int64_t size, bool may_be_null, const ExternalType*& type, std::uint32_t& area) {
+    const ExternalType* found = FindCode(kTypes, code);
+    if (!found) return errors::kUnknownType;
+    if (code == SQLT_BFLOAT && size == kMachineFloat.least_size) found = &kMachineFloat;
+    if (code == SQLT_BDOUBLE && size == kMachineDouble.least_size) found = &kMachineDouble;
+    if (size == 0 && may_be_null) {
+        if (const ExternalType* null = FindCode(kWithoutSize, code)) found = null;
+    }
+    type = found;
+    return CheckSize(*found, size, area);
 }
 
-// Numbers and dates of fixed form may lie in a larger area; integers and reals fill theirs; pointers need no size.
-int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area) {
-    if (type.is_pointer && size <= 0) size = kPointer;
-    const bool variable = !type.is_pointer && (type.family == Family::text || type.family == Family::bytes);
-    if (size < type.least_size) return variable ? errors::kBadAreaLength : errors::kBadFixedLength;
-    const bool power_of_two = (size & (size - 1)) == 0;
-    if (type.family == Family::integer && (size > 8 || !power_of_two)) return errors::kBadFixedLength;
-    if (type.family == Family::real && (size > 16 || !power_of_two)) return errors::kBadFixedLength;
-    area = static_cast<std::uint32_t>(size);
-    return 0;
+engine::Kind KindOf(const ExternalType& type, std::uint32_t size) {
+    switch (type.family) {
+        case Family::text: return engine::Kind::text;
+        case Family::bytes: return engine::Kind::bytes;
+        case Family::number: return engine::Kind::decimal;
+        case Family::integer:
+            return type.code == SQLT_UIN && size == sizeof(std::uint64_t) ? engine::Kind::decimal : engine::Kind::integer;
+        case Family::real: return engine::Kind::real;
+        case Family::date: return engine::Kind::timestamp;
+        case Family::row_id: return engine::Kind::row_id;
+        case Family::lob: return engine::Kind::lob;
+        case Family::cursor: return engine::Kind::cursor;
+    }
+    return engine::Kind::null;
+}
+
+bool KnowsCharacterSet(std::uint16_t id) {
+    constexpr std::uint16_t kUtf8 = 871, kUtf8Full = 873;
+    return id == 0 || id == kUtf8 || id == kUtf8Full || id == OCI_UTF16ID;
 }
 
 int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter>& converters, Workspace& workspace,
@@ -115,6 +165,7 @@ int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter
     Target target{at, elements.size};
     const int error = converters[static_cast<std::size_t>(datum.kind)](datum, workspace, target);
     if (error == errors::kTruncated) return StoreTruncated(elements, index, target);
+    if (error == kPlaceGone) return errors::kNoDefines;
     elements.SetCode(index, error);
     if (error != 0) return error;
     elements.SetIndicator(index, 0);

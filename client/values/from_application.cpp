@@ -67,6 +67,13 @@ int TerminatedBytes(const Source& source, bool utf16, View& bytes) {
     return 0;
 }
 
+void SetDecimal(const OCINumber& number, Workspace& workspace, Datum& datum) {
+    std::memcpy(workspace.small.data(), &number, sizeof number);
+    datum.kind = Kind::decimal;
+    datum.length = sizeof number;
+    datum.data = workspace.small.data();
+}
+
 // Whole numbers of up to 64 bits go as such, the others as decimals in the workspace.
 int SetNumber(const OCINumber& number, Workspace& workspace, Datum& datum) {
     int is_integer = 0;
@@ -75,10 +82,7 @@ int SetNumber(const OCINumber& number, Workspace& workspace, Datum& datum) {
         datum.kind = Kind::integer;
         return 0;
     }
-    std::memcpy(workspace.small.data(), &number, sizeof number);
-    datum.kind = Kind::decimal;
-    datum.length = sizeof number;
-    datum.data = workspace.small.data();
+    SetDecimal(number, workspace, datum);
     return 0;
 }
 
@@ -98,7 +102,7 @@ int FromDecimal(const Source& source, Workspace& workspace, Datum& datum) {
 }
 
 int SetDate(const date::DateTime& value, Workspace& workspace, Datum& datum) {
-    SetView(Kind::timestamp, {workspace.small.data(), date::ToEngineText(value, workspace.small.data())}, datum);
+    SetTimestamp(value, workspace, datum);
     return 0;
 }
 
@@ -204,6 +208,24 @@ int FromOdt(const Source& source, Workspace& workspace, Datum& datum) {
     return SetDate(value, workspace, datum);
 }
 
+void SetTimestamp(const date::DateTime& value, Workspace& workspace, Datum& datum) {
+    static_assert(alignof(date::DateTime) <= 8);    // that of the workspace
+    std::memcpy(workspace.small.data(), &value, sizeof value);
+    datum.kind = Kind::timestamp;
+    datum.length = sizeof value;
+    datum.data = workspace.small.data();
+}
+
+void Widen(Datum& datum, Workspace& workspace) {
+    OCINumber number;
+    number::FromInt64(datum.integer, &number);
+    SetDecimal(number, workspace, datum);
+}
+
+int FromNull(const Source&, Workspace&, Datum& datum) {
+    datum.kind = Kind::null;
+    return 0;
+}
 int FromNothing(const Source&, Workspace&, Datum&) { return errors::kInconsistentTypes; }
 
 }  // namespace values

@@ -1,6 +1,7 @@
 // The converters from the application's elements to engine values, by external type.
 #pragma once
 
+#include "date/date.h"
 #include "values/conversion.h"
 
 namespace values {
@@ -25,10 +26,14 @@ int FromString(const Source&, Workspace&, engine::Datum&);      // OCIString*
 int FromRaw(const Source&, Workspace&, engine::Datum&);         // OCIRaw*
 int FromDatetime(const Source&, Workspace&, engine::Datum&);    // OCIDateTime*
 int FromRdd(const Source&, Workspace&, engine::Datum&);         // OCIRowid*
+int FromNull(const Source&, Workspace&, engine::Datum&);        // null, whatever stands there
 int FromNothing(const Source&, Workspace&, engine::Datum&);     // no conversion: 932
 
-// A text that is compared with row ids becomes one.
-int RowIdFromText(engine::Datum&);
+// A text that is compared with row ids becomes one, in the workspace.
+int RowIdFromText(Workspace&, engine::Datum&);
+
+// A date in the workspace.
+void SetTimestamp(const date::DateTime& value, Workspace&, engine::Datum&);
 
 // A whole value that came in pieces; data must live until the Datum is used.
 int FromWholeText(std::string_view data, Workspace&, engine::Datum&);

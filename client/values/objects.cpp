@@ -27,7 +27,9 @@ int PutVariable(View content, Workspace& workspace, Target& target) {
     void* pointer = PointerAt(target.at);
     T* value = pointer ? Live<T>(pointer) : Create<T>(*workspace.environment, 0, 0);
     if (!value) return errors::kBadObject;
-    if (!value->Assign(content).Ok()) return errors::kLengthPastArea;
+    const bool fits = value->Assign(content).Ok();
+    if (live::KindOf(workspace.holder) == ::Kind::none) return kPlaceGone;
+    if (!fits) return errors::kLengthPastArea;
     pointer = value;
     std::memcpy(target.at, &pointer, sizeof pointer);
     target.stored = sizeof pointer;
@@ -44,7 +46,7 @@ int FromVariable(const Source& source, Workspace& workspace, Datum& datum,
 }
 
 int RowIdOfDatum(const Datum& datum, Workspace&, rowid::RowId& value) {
-    value = {datum.length, datum.integer};
+    value = rowid::FromBytes(datum.Row().bytes.data());
     return 0;
 }
 int RowIdOfText(const Datum& datum, Workspace&, rowid::RowId& value) {
@@ -63,17 +65,22 @@ int PutRdd(const rowid::RowId& value, Workspace&, Target& target) {
     return 0;
 }
 
-void SetRowId(const rowid::RowId& value, Datum& datum) {
+// 1410 for a row id that no row of an engine can have.
+int SetRowId(const rowid::RowId& value, Workspace& workspace, Datum& datum) {
+    engine::RowId row;
+    if (!rowid::ToBytes(value, row.bytes.data())) return errors::kInvalidRowId;
+    std::memcpy(workspace.small.data(), &row, sizeof row);
     datum.kind = Kind::row_id;
-    datum.length = value.table;
-    datum.integer = value.row;
+    datum.length = sizeof row;
+    datum.data = workspace.small.data();
+    return 0;
 }
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kRowIdRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<rowid::RowId, RowIdOfText, put>, NoConversion,
     NoConversion, NoConversion, Through<rowid::RowId, RowIdOfDatum, put>, NoConversion, NoConversion,
-    NoConversion};
+    NoConversion, NoConversion, NoConversion};
 
 }  // namespace
 
@@ -105,33 +112,27 @@ int FromDatetime(const Source& source, Workspace& workspace, Datum& datum) {
     const auto* descriptor = Live<DateTimeDescriptor>(PointerAt(source.at));
     if (!descriptor) return errors::kBadObject;
     if (!descriptor->IsSet()) return errors::kInvalidDateTime;
-    constexpr std::size_t kDatePart = 11;    // with the blank
-    std::size_t length = date::ToEngineText(descriptor->Value(), workspace.small.data());
-    const std::size_t skipped = descriptor->HasDate() ? 0 : kDatePart;
-    datum.kind = Kind::timestamp;
-    datum.data = workspace.small.data() + skipped;
-    datum.length = static_cast<std::uint32_t>(length - skipped);
+    date::DateTime value = descriptor->Value();
+    if (!descriptor->HasDate()) value.year = 0, value.month = value.day = 0;
+    SetTimestamp(value, workspace, datum);
     return 0;
 }
 
-int FromRid(const Source& source, Workspace&, Datum& datum) {
-    SetRowId(rowid::FromBytes(reinterpret_cast<const std::uint8_t*>(source.at)), datum);
-    return 0;
+int FromRid(const Source& source, Workspace& workspace, Datum& datum) {
+    return SetRowId(rowid::FromBytes(reinterpret_cast<const std::uint8_t*>(source.at)), workspace, datum);
 }
 
-int FromRdd(const Source& source, Workspace&, Datum& datum) {
+int FromRdd(const Source& source, Workspace& workspace, Datum& datum) {
     const auto* descriptor = Live<RowIdDescriptor>(PointerAt(source.at));
     if (!descriptor) return errors::kBadObject;
     if (!descriptor->value) return errors::kInvalidRowId;
-    SetRowId(*descriptor->value, datum);
-    return 0;
+    return SetRowId(*descriptor->value, workspace, datum);
 }
 
-int RowIdFromText(Datum& datum) {
+int RowIdFromText(Workspace& workspace, Datum& datum) {
     rowid::RowId value;
     if (!rowid::FromText(datum.Text(), &value)) return errors::kInvalidRowId;
-    SetRowId(value, datum);
-    return 0;
+    return SetRowId(value, workspace, datum);
 }
 
 }  // namespace values

@@ -9,6 +9,11 @@ namespace {
 
 using engine::Datum;
 
+int OwnDate(const Datum& datum, Workspace&, date::DateTime& value) {
+    value = datum.Timestamp();
+    return 0;
+}
+
 // The engines' form; character data may also be in the default model of dates.
 int DateOfText(const Datum& datum, Workspace&, date::DateTime& value) {
     if (date::FromEngineText(datum.Text(), &value) == 0) return 0;
@@ -32,7 +37,8 @@ int PutOdt(const date::DateTime& value, Workspace&, Target& target) {
 template <auto put>
 constexpr ByOrigin<OutConverter> kDateRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<date::DateTime, DateOfText, put>, NoConversion,
-    Through<date::DateTime, DateOfText, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
+    Through<date::DateTime, OwnDate, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion,
+    NoConversion, Through<date::DateTime, DateOfText, put>};
 
 }  // namespace
 

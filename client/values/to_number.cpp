@@ -24,6 +24,9 @@ int NumberOfReal(const Datum& datum, Workspace&, OCINumber& number) {
 int NumberOfBinaryReal(const Datum& datum, Workspace&, OCINumber& number) {
     return AsConversionError(number::FromDouble(datum.real, &number));
 }
+int NumberOfSingleReal(const Datum& datum, Workspace&, OCINumber& number) {
+    return AsConversionError(number::FromDouble(SingleByDigits(datum.real), &number));
+}
 int OwnNumber(const Datum& datum, Workspace&, OCINumber& number) {
     std::memcpy(&number, datum.data, sizeof number);
     return 0;
@@ -132,22 +135,29 @@ int PutFlt(double value, Workspace&, Target& target) {
     return PutBytes(&narrow, sizeof narrow, target);
 }
 
-template <class Form, auto put, auto integer, auto real, auto decimal, auto text, auto binary_real>
+template <class Form, auto put, auto integer, auto real, auto decimal, auto text, auto binary_real,
+          auto single_real>
 constexpr ByOrigin<OutConverter> kRow = {
     NoConversion, Through<Form, integer, put>, Through<Form, real, put>, Through<Form, decimal, put>,
     Through<Form, text, put>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion,
-    Through<Form, text, put>, Through<Form, binary_real, put>};
+    Through<Form, text, put>, Through<Form, binary_real, put>, Through<Form, single_real, put>, NoConversion};
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kNumberRow =
-    kRow<OCINumber, put, NumberOfInteger, NumberOfReal, OwnNumber, NumberOfText, NumberOfBinaryReal>;
+    kRow<OCINumber, put, NumberOfInteger, NumberOfReal, OwnNumber, NumberOfText, NumberOfBinaryReal,
+         NumberOfSingleReal>;
 
 template <class Integer, auto put, auto integer>
 constexpr ByOrigin<OutConverter> kIntegerRow =
     kRow<Integer, put, integer, IntegerOfReal<Integer>, IntegerOfNumber<Integer, OwnNumber>,
-         IntegerOfNumber<Integer, NumberOfText>, IntegerOfBinaryReal<Integer>>;
+         IntegerOfNumber<Integer, NumberOfText>, IntegerOfBinaryReal<Integer>, IntegerOfBinaryReal<Integer>>;
 
 }  // namespace
+
+double SingleByDigits(double value) {
+    const auto single = static_cast<float>(value);
+    return static_cast<double>(single) == value ? number::WidenByDigits(single) : value;
+}
 
 int AsConversionError(int error) {
     switch (error) {
@@ -166,6 +176,7 @@ const ByOrigin<OutConverter> kToDecimal128 = kNumberRow<PutDecimal<number::kDeci
 const ByOrigin<OutConverter> kToInt = kIntegerRow<std::int64_t, PutInt, IntOfInteger>;
 const ByOrigin<OutConverter> kToUin = kIntegerRow<std::uint64_t, PutUin, UintOfInteger>;
 const ByOrigin<OutConverter> kToFlt =
-    kRow<double, PutFlt, RealOfInteger, OwnReal, RealOfNumber<OwnNumber>, RealOfNumber<NumberOfText>, OwnReal>;
+    kRow<double, PutFlt, RealOfInteger, OwnReal, RealOfNumber<OwnNumber>, RealOfNumber<NumberOfText>, OwnReal,
+         OwnReal>;
 
 }  // namespace values

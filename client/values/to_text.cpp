@@ -84,6 +84,12 @@ int BinaryRealText(const Datum& datum, Workspace& workspace, View& text) {
     return 0;
 }
 
+int SingleRealText(const Datum& datum, Workspace& workspace, View& text) {
+    Datum single = datum;
+    single.real = SingleByDigits(datum.real);
+    return BinaryRealText(single, workspace, text);
+}
+
 // Digits from the first that is not 0.
 std::ptrdiff_t SignificantDigits(View text) {
     text.remove_prefix(std::min(text.find_first_of("123456789"), text.size()));
@@ -153,26 +159,42 @@ View ModelOf(ColumnClass column) {
     }
 }
 
-// In the default model of the column's type; what is no date, a time alone included, stays as it is.
+int ModelText(const date::DateTime& value, Workspace& workspace, View& text) {
+    std::size_t length = 0;
+    char* begin = workspace.small.data();
+    const auto scope = workspace.column == ColumnClass::date ? date::Scope::date : date::Scope::timestamp;
+    const int error = date::ToText(value, ModelOf(workspace.column), date::kEnglish, scope, begin,
+                                   workspace.small.size(), &length);
+    text = {begin, length};
+    return error;
+}
+
+// In the default model of the column's type. A time alone is shown as the engines write it.
+int TimestampText(const Datum& datum, Workspace& workspace, View& text) {
+    const date::DateTime value = datum.Timestamp();
+    if (value.month != 0) return ModelText(value, workspace, text);
+    constexpr std::size_t kDatePart = 11;    // with the blank
+    const View whole(workspace.small.data(), date::ToEngineText(value, workspace.small.data()));
+    text = whole.substr(std::min(kDatePart, whole.size()));
+    return 0;
+}
+
+// The same of a text in a column of dates; what is no date, a time alone included, stays as it is.
 int DateText(const Datum& datum, Workspace& workspace, View& text) {
     constexpr std::size_t kShortDate = 9;
-    const View model = ModelOf(workspace.column);
     char* begin = workspace.small.data();
-    if (model.data() == date::kDateModel.data() && ShortDate(datum.Text(), begin)) {
+    if (ModelOf(workspace.column).data() == date::kDateModel.data() && ShortDate(datum.Text(), begin)) {
         text = {begin, kShortDate};
         return 0;
     }
     date::DateTime value;
     if (date::FromEngineText(datum.Text(), &value) != 0 || value.month == 0) return OwnText(datum, workspace, text);
-    std::size_t length = 0;
-    const auto scope = workspace.column == ColumnClass::date ? date::Scope::date : date::Scope::timestamp;
-    const int error = date::ToText(value, model, date::kEnglish, scope, begin, workspace.small.size(), &length);
-    text = {begin, length};
-    return error;
+    return ModelText(value, workspace, text);
 }
 
 int RowIdText(const Datum& datum, Workspace& workspace, View& text) {
-    text = {workspace.small.data(), rowid::ToText({datum.length, datum.integer}, workspace.small.data())};
+    const rowid::RowId value = rowid::FromBytes(datum.Row().bytes.data());
+    text = {workspace.small.data(), rowid::ToText(value, workspace.small.data())};
     return 0;
 }
 
@@ -288,13 +310,14 @@ template <auto put>
 constexpr ByOrigin<OutConverter> kTextRow = {
     NoConversion,                    Through<View, IntegerText, put>, Through<View, RealText, put>,
     Through<View, DecimalText, put>, Through<View, OwnText, put>,     Through<View, HexText, put>,
-    Through<View, DateText, put>,    NoConversion,                    Through<View, RowIdText, put>,
-    NoConversion,                    Through<View, NumericText, put>, Through<View, BinaryRealText, put>};
+    Through<View, TimestampText, put>, NoConversion,                  Through<View, RowIdText, put>,
+    NoConversion,                    Through<View, NumericText, put>, Through<View, BinaryRealText, put>,
+    Through<View, SingleRealText, put>, Through<View, DateText, put>};
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kBytesRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<View, BytesOfHex, put>, Through<View, OwnText, put>,
-    NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
+    NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
 
 }  // namespace
 
@@ -318,8 +341,9 @@ const ByOrigin<OutConverter> kToVbi = kBytesRow<PutVbi>;
 const ByOrigin<OutConverter> kToRaw = kBytesRow<PutRaw>;
 
 const ByOrigin<Renderer> kWholeText = {NoText, IntegerText, RealText, DecimalText, OwnText, HexText,
-                                       DateText, NoText, RowIdText, NoText, NumericText, BinaryRealText};
+                                       TimestampText, NoText, RowIdText, NoText, NumericText, BinaryRealText, SingleRealText,
+                                       DateText};
 const ByOrigin<Renderer> kWholeBytes = {NoText, NoText, NoText, NoText, BytesOfHex, OwnText,
-                                        NoText, NoText, NoText, NoText, NoText, NoText};
+                                        NoText, NoText, NoText, NoText, NoText, NoText, NoText, NoText};
 
 }  // namespace values

@@ -158,6 +158,37 @@ TEST_F(Executing, RowsThatFail) {
     }
 }
 
+// What an error handle tells of rows is that of the last execute through it.
+TEST_F(Executing, RowsThatFailAreForgotten) {
+    MustRun("create table t(a number primary key)");
+    sb4 numbers[4] = {1, 1, 2, 1};
+    const struct { ub4 iterations; sb4 answer; ub4 failed; ub4 first_failed; } cases[] = {
+        {4, 24381, 2, 1}, {3, 24381, 1, 1}, {1, 0, 0, 0}};
+    for (const auto& c : cases) {
+        MustRun("delete from t");
+        ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
+        ASSERT_EQ(Bind(1, {numbers, 4, SQLT_INT}), 0);
+        EXPECT_EQ(Execute(c.iterations, OCI_BATCH_ERRORS), c.answer);
+        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_DML_ERRORS), c.failed) << c.iterations;
+        auto* const other = New<OCIError>(OCI_HTYPE_ERROR);
+        dvoid* row_error = nullptr;
+        EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row_error, c.failed), OCI_ERROR) << "no more than these";
+        if (c.failed == 0) continue;
+        ASSERT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row_error, 0), OCI_SUCCESS);
+        ub4 offset = 9;
+        OCIAttrGet(row_error, OCI_HTYPE_ERROR, &offset, nullptr, OCI_ATTR_DML_ROW_OFFSET, other);
+        EXPECT_EQ(offset, c.first_failed);
+    }
+    MustRun("delete from t");
+    ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
+    ASSERT_EQ(Bind(1, {numbers, 4, SQLT_INT}), 0);
+    EXPECT_EQ(Execute(2), 1);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, err, OCI_HTYPE_ERROR), 1u);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 1u);
+    MustRun("delete from t");
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, err, OCI_HTYPE_ERROR), 0u);
+}
+
 TEST_F(Executing, ValueThatCannotBeReadFailsItsRow) {
     MustRun("create table t(a number)");
     char areas[3][4] = {{'1', 0, 0, 0}, {'1', '2', '3', '4'}, {'5', 0, 0, 0}};
@@ -197,6 +228,45 @@ TEST_F(Executing, DefinitionThatFailsToCompileCommitsNothing) {
     EXPECT_EQ(One("select count(*) from t"), "0");
 }
 
+// A definition commits what came before it, even if it fails when it runs.
+TEST_F(Executing, DefinitionThatFailsInRunningHasCommitted) {
+    MustRun("create table t(a number)");
+    MustRun("insert into t values(1)");
+    MustRun("insert into t values(1)");
+    EXPECT_EQ(Run("create unique index i on t(a)"), 1);
+    MustRun("rollback");
+    EXPECT_EQ(One("select count(*) from t"), "2");
+}
+
+// The session counts the results that are open.
+TEST_F(Executing, OpenStatementsAreCounted) {
+    OCISession* session = nullptr;
+    ASSERT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err)), 0);
+    const auto open = [&] { return Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION); };
+    OCIStmt* statements[3];
+    for (ub4 index = 0; index < 3; ++index) {
+        stmt = statements[index] = New<OCIStmt>(OCI_HTYPE_STMT);
+        ASSERT_EQ(Prepare("select 1 from dual"), 0);
+        ASSERT_EQ(Execute(0), 0);
+        EXPECT_EQ(open(), index + 1);
+        ASSERT_EQ(Execute(0), 0) << "again: the former result is closed";
+        EXPECT_EQ(open(), index + 1);
+    }
+    EXPECT_EQ(Fetch(0), 0);
+    EXPECT_EQ(open(), 2u);
+    OCIStmt* const block = New<OCIStmt>(OCI_HTYPE_STMT);
+    stmt = block;
+    ASSERT_EQ(Prepare("begin open :c for select 1 from dual; end;"), 0);
+    ASSERT_EQ(Bind(1, {&statements[1], 8, SQLT_RSET}), 0);
+    ASSERT_EQ(Execute(), 0);
+    EXPECT_EQ(open(), 2u) << "one result took the place of another";
+    OCIHandleFree(statements[1], OCI_HTYPE_STMT);
+    EXPECT_EQ(open(), 1u);
+    stmt = statements[0];
+    ASSERT_EQ(Prepare("select 2 from dual"), 0);
+    EXPECT_EQ(open(), 0u);
+}
+
 TEST_F(Executing, OpenQueryOutlivesCommitAndOtherStatements) {
     MustRun("create table t(a number)");
     MustRun("insert into t values(1)");
@@ -228,6 +298,8 @@ TEST_F(Executing, LogoffEndsWhatIsOpen) {
     ASSERT_EQ(OCILogoff(svc, err), OCI_SUCCESS);
     EXPECT_EQ(Fetch(), 3114);
     EXPECT_EQ(Execute(0), 3114);
+    ASSERT_EQ(Prepare("select 2 from dual"), 0);
+    EXPECT_EQ(Fetch(), 24338) << "a new text was never executed";
 }
 
 TEST_F(Executing, RowIdOfTheLastChange) {

@@ -115,6 +115,24 @@ TEST_F(Fetching, LongTruncationHasNoLengthToShow) {
     EXPECT_EQ(indicator, -2);
 }
 
+// The longest value whose length an indicator can tell, and the longest that a length can.
+TEST_F(Fetching, LengthsAtTheirLimits) {
+    const struct { int whole; sb4 room; sb4 answer; sb2 indicator; ub2 length; } cases[] = {
+        {32766, 10, 24345, 32766, 10}, {32767, 10, 24345, 32767, 10}, {32768, 10, 24345, -2, 10},
+        {65534, 200000, 0, 0, 65534}, {65535, 200000, 0, 0, 65535}, {65536, 200000, 0, 0, 65535},
+        {100003, 200000, 0, 0, 65535}, {100003, 70000, 24345, -2, 65535}};
+    for (const auto& c : cases) {
+        std::string area(static_cast<std::size_t>(c.room), '#');
+        sb2 indicator = 9;
+        ub2 code = 0, length = 9;
+        ASSERT_EQ(Prepare("select printf('%.*c', " + std::to_string(c.whole) + ", 'x') from dual"), 0);
+        ASSERT_EQ(Define(1, {area.data(), c.room, SQLT_CHR, &indicator, &length, &code}), 0);
+        EXPECT_EQ(Execute(1), c.answer) << c.whole << " in " << c.room;
+        EXPECT_EQ(indicator, c.indicator) << c.whole << " in " << c.room;
+        EXPECT_EQ(length, c.length) << c.whole << " in " << c.room;
+    }
+}
+
 TEST_F(Fetching, BadRowInTheMiddle) {
     ASSERT_EQ(Prepare("select name from t order by id"), 0);
     ASSERT_EQ(Define(1, {names_, sizeof names_[0], SQLT_STR}), 0);
@@ -140,15 +158,16 @@ TEST_F(Fetching, ExecuteDeliversRowsFromTheOffset) {
 }
 
 TEST_F(Fetching, ExactFetch) {
-    const struct { ub4 rows; sword rc; sb4 number; } cases[] = {
-        {7, OCI_SUCCESS, 0}, {6, OCI_ERROR, 1422}, {8, OCI_NO_DATA, 1403}};
+    const struct { ub4 rows; sword rc; sb4 number; sb4 fetch; ub4 state; } cases[] = {
+        {7, OCI_SUCCESS, 0, 1002, 3}, {6, OCI_ERROR, 1422, 24374, 3}, {8, OCI_NO_DATA, 1403, 1002, 3}};
     ASSERT_EQ(Prepare("select id from t order by id"), 0);
     ASSERT_EQ(Define(1, {ids_, 4, SQLT_INT}), 0);
     for (const auto& c : cases) {
         const sword rc = OCIStmtExecute(svc, stmt, err, c.rows, 0, nullptr, nullptr, OCI_EXACT_FETCH);
         EXPECT_EQ(rc, c.rc) << c.rows;
         EXPECT_EQ(Answer(rc), c.number) << c.rows;
-        EXPECT_NE(Fetch(), 0) << "closed";
+        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_STMT_STATE), c.state) << c.rows;
+        EXPECT_EQ(Fetch(), c.fetch) << c.rows;
     }
 }
 
@@ -221,6 +240,37 @@ TEST_F(Fetching, DefinesMayBeMadeAnewAndFreed) {
     ASSERT_EQ(Fetch(1), 0) << "the other column is still defined";
     EXPECT_EQ(wide, -1);
     EXPECT_EQ(real, 0);
+}
+
+// Of several columns, an error in one tells more than a truncation in another, whichever comes first.
+TEST_F(Fetching, TheGravestOfARow) {
+    for (const bool cut_first : {true, false}) {
+        char text[3] = "";
+        ub2 code = 0;
+        sb1 small = 0;
+        ASSERT_EQ(Prepare(cut_first ? "select 'abcdef', 1000 from dual" : "select 1000, 'abcdef' from dual"), 0);
+        ASSERT_EQ(Define(cut_first ? 1 : 2, {text, 3, SQLT_STR, nullptr, nullptr, &code}), 0);
+        ASSERT_EQ(Define(cut_first ? 2 : 1, {&small, 1, SQLT_INT}), 0);
+        EXPECT_EQ(Execute(1), 1455) << cut_first;
+        EXPECT_EQ(code, 1406) << "the other column is stored all the same";
+    }
+}
+
+// The rows of a fetch behind one that failed count on, and the count is that of the rows reached.
+TEST_F(Fetching, CountsAroundABadRow) {
+    ASSERT_EQ(Prepare("select name from t order by id"), 0);
+    ASSERT_EQ(Define(1, {names_, sizeof names_[0], SQLT_STR}), 0);
+    ASSERT_EQ(Execute(0), 0);
+    EXPECT_EQ(Fetch(2), 0);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 2u);
+    EXPECT_EQ(Fetch(2), 1405);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_FETCHED), 0u);
+    EXPECT_EQ(Fetch(2), 0);
+    EXPECT_STREQ(names_[0], "row 4");
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 5u);
+    EXPECT_EQ(Fetch(2), 0);
+    EXPECT_EQ(Fetch(2), 1403);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 7u);
 }
 
 // ---- Pieces

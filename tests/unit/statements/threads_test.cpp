@@ -51,4 +51,106 @@ TEST_F(Threads, StatementsOfOneSession) {
     EXPECT_EQ(One("select count(distinct a) from t"), "200");
 }
 
+// One thread asks the application's own bind, a define's position and a parameter, while another frees their statement.
+TEST_F(Threads, HandlesAskedWhileTheirStatementIsFreed) {
+    constexpr int kRounds = 1500;
+    std::atomic<int> round = 0, failures = 0;
+    std::atomic<OCIStmt*> made{nullptr};
+    std::atomic<dvoid*> parameter{nullptr};
+    auto* const bind = New<OCIBind>(OCI_HTYPE_BIND);
+    std::thread asking([&] {
+        OCIError* error = New<OCIError>(OCI_HTYPE_ERROR);
+        while (round < kRounds) {
+            ub4 position = 0;
+            failures += OCIAttrGet(bind, OCI_HTYPE_BIND, &position, nullptr, OCI_ATTR_HANDLE_POSITION, error) != OCI_SUCCESS;
+            sb4 value = 0;
+            ub4 length = 4;
+            (void)OCIStmtSetPieceInfo(bind, OCI_HTYPE_BIND, error, &value, &length, OCI_ONE_PIECE, nullptr, nullptr);
+            ub2 type = 0;
+            (void)OCIAttrGet(parameter.load(), OCI_DTYPE_PARAM, &type, nullptr, OCI_ATTR_DATA_TYPE, error);
+        }
+    });
+    sb4 value = 1;
+    for (; round < kRounds; ++round) {
+        OCIStmt* statement = New<OCIStmt>(OCI_HTYPE_STMT);
+        OCIBind* own = bind;
+        failures += Prepare(statement, "select :1 from dual") != 0;
+        failures += OCIBindByPos(statement, &own, err, 1, &value, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr,
+                                 OCI_DEFAULT);
+        failures += own != bind;
+        failures += OCIStmtExecute(svc, statement, err, 0, 0, nullptr, nullptr, OCI_DEFAULT);
+        dvoid* column = nullptr;
+        failures += OCIParamGet(statement, OCI_HTYPE_STMT, err, &column, 1);
+        parameter = column;
+        failures += OCIHandleFree(statement, OCI_HTYPE_STMT);
+    }
+    asking.join();
+    EXPECT_EQ(failures, 0);
+}
+
+// Statements move between two sessions in two threads, crosswise, and give each other's session's statements results.
+TEST_F(Threads, StatementsMoveBetweenSessions) {
+    OCISvcCtx* second = nullptr;
+    const auto* memory = reinterpret_cast<const OraText*>(":memory:");
+    ASSERT_EQ(OCILogon(env, err, &second, nullptr, 0, nullptr, 0, memory, 8), OCI_SUCCESS);
+    OCIStmt* shared[2] = {New<OCIStmt>(OCI_HTYPE_STMT), New<OCIStmt>(OCI_HTYPE_STMT)};
+    std::atomic<int> failures = 0;
+    const auto work = [&](int thread) {
+        OCIError* error = New<OCIError>(OCI_HTYPE_ERROR);
+        OCIStmt* const own = New<OCIStmt>(OCI_HTYPE_STMT);
+        OCIStmt* const block = New<OCIStmt>(OCI_HTYPE_STMT);
+        const auto prepare = [&](OCIStmt* statement, std::string_view text) {
+            return OCIStmtPrepare(statement, error, reinterpret_cast<const OraText*>(text.data()),
+                                  static_cast<ub4>(text.size()), OCI_NTV_SYNTAX, OCI_DEFAULT);
+        };
+        OCIBind* bind = nullptr;
+        OCIStmt* target = shared[thread];
+        failures += prepare(own, "select 1 from dual") + prepare(block, "begin open :c for select 2 from dual; end;");
+        failures += OCIBindByPos(block, &bind, error, 1, &target, 8, SQLT_CUR, nullptr, nullptr, nullptr, 0, nullptr,
+                                 OCI_DEFAULT);
+        for (int round = 0; round < 300; ++round) {
+            OCISvcCtx* const here = (round + thread) % 2 ? svc : second;
+            target = shared[(round / 2 + thread) % 2];
+            failures += OCIStmtExecute(here, own, error, 0, 0, nullptr, nullptr, OCI_DEFAULT);
+            failures += OCIStmtExecute(here, block, error, 1, 0, nullptr, nullptr, OCI_DEFAULT);
+        }
+    };
+    std::thread other(work, 1);
+    work(0);
+    other.join();
+    EXPECT_EQ(failures, 0);
+    EXPECT_EQ(OCILogoff(second, err), OCI_SUCCESS);
+}
+
+// A session ends and begins anew while statements execute on its context: each answers, none is torn.
+TEST_F(Threads, ExecuteBesideLogoff) {
+    std::atomic<bool> done = false;
+    std::atomic<int> wrong = 0;
+    OCISvcCtx* context = nullptr;
+    const auto* memory = reinterpret_cast<const OraText*>(":memory:");
+    ASSERT_EQ(OCILogon(env, err, &context, nullptr, 0, nullptr, 0, memory, 8), OCI_SUCCESS);
+    std::thread executing([&] {
+        OCIError* error = New<OCIError>(OCI_HTYPE_ERROR);
+        OCIStmt* const statement = New<OCIStmt>(OCI_HTYPE_STMT);
+        const auto* text = reinterpret_cast<const OraText*>("select 1 from dual");
+        wrong += OCIStmtPrepare(statement, error, text, 18, OCI_NTV_SYNTAX, OCI_DEFAULT);
+        while (!done) {
+            const sword rc = OCIStmtExecute(context, statement, error, 0, 0, nullptr, nullptr, OCI_DEFAULT);
+            sb4 number = 0;
+            if (rc == OCI_ERROR) OCIErrorGet(error, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
+            wrong += rc != OCI_SUCCESS && number != 3114 && number != 1012;
+        }
+    });
+    for (int round = 0; round < 200; ++round) {
+        EXPECT_EQ(OCILogoff(context, err), OCI_SUCCESS);
+        OCISvcCtx* same = context;
+        EXPECT_EQ(OCILogon(env, err, &same, nullptr, 0, nullptr, 0, memory, 8), OCI_SUCCESS);
+        EXPECT_EQ(same, context);
+        if (::testing::Test::HasFailure()) break;
+    }
+    done = true;
+    executing.join();
+    EXPECT_EQ(wrong, 0);
+}
+
 }  // namespace

@@ -115,6 +115,9 @@ TEST_F(Conversions, Integers) {
         {"-2147483648", SQLT_INT, 4, -2147483648LL, 0}, {"2147483648", SQLT_INT, 4, 0, 1455},
         {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0}, {"9.3e18", SQLT_INT, 8, 0, 1455},
         {"-9.3e18", SQLT_INT, 8, 0, 1455},
+        {"9223372036854775807 + 1", SQLT_INT, 8, 0, 1455}, {"-9223372036854775807 - 1", SQLT_INT, 8, INT64_MIN, 0},
+        {"-9223372036854775808 - 2048", SQLT_INT, 8, 0, 1455},
+        {"18446744073709551616", SQLT_UIN, 8, 0, 1455}, {"18446744073709549568.0", SQLT_UIN, 8, -2048, 0},
         {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0}, {"-2.99", SQLT_INT, 4, -2, 0},
         {"' 17 '", SQLT_INT, 4, 17, 0}, {"4.35 * 100", SQLT_INT, 4, 435, 0}, {"9.95 * 100", SQLT_UIN, 2, 995, 0},
         {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722},
@@ -153,6 +156,12 @@ TEST_F(Conversions, OtherNumbers) {
     EXPECT_EQ(Hex(Out("-12345", SQLT_PDN, 3)), "12345D");
     EXPECT_EQ(Hex(Out("7", SQLT_PDN, 3)), "00007C");
     EXPECT_EQ(Out("123456", SQLT_PDN, 3), "!1457");
+    // In an area of their size, codes 21 and 22 are the machine's float and double.
+    EXPECT_EQ(Out("0.1", SQLT_BFLOAT, 4), Raw(0.1f));
+    EXPECT_EQ(Out("0.1", SQLT_BDOUBLE, 8), Raw(0.1));
+    EXPECT_EQ(Out("1e39", SQLT_BFLOAT, 4), "!1426");
+    EXPECT_EQ(In(Raw(0.1f), SQLT_BFLOAT, "cast(:1 as varchar(40))"), In(Raw(0.1f), SQLT_FLT, "cast(:1 as varchar(40))"));
+    EXPECT_EQ(In(Raw(-2.5), SQLT_BDOUBLE, "quote(:1)"), "-2.5");
     // Decimal floats come back through the same types and are shown by the cast that displays them.
     for (const char* number : {"0", "1.5", "-123456789.012345", "1E+100", "1234567890123456"}) {
         const std::string wide = Out(std::string("'") + number + "'", SQLT_BDOUBLE, 16);
@@ -174,6 +183,45 @@ TEST_F(Conversions, BinaryColumnsKeepTheirReals) {
     }
     EXPECT_EQ(Run("insert into r(f) values(1e39)"), 1426);
     EXPECT_EQ(Run("insert into r(d) values('one')"), 1722);
+}
+
+// Values of single-precision columns have the digits of that width, whatever engine or type shows them.
+TEST_F(Conversions, SinglePrecisionColumns) {
+    MustRun("create table r(f binary_float)");
+    sb4 row = 0;
+    for (const float value : {0.1f, 3.4028235e38f, 1.17549435e-38f, 16777216.0f, -1.5f}) {
+        MustRun("delete from r");
+        ASSERT_EQ(Prepare("insert into r values(:1)"), 0);
+        ASSERT_EQ(Bind(1, {const_cast<float*>(&value), 4, SQLT_IBFLOAT}), 0);
+        ASSERT_EQ(Execute(), 0);
+        float single = 0;
+        double wide = 0;
+        OCINumber number{};
+        char text[60] = "";
+        const struct { dvoid* at; sb4 size; ub2 type; } areas[] = {
+            {&single, 4, SQLT_IBFLOAT}, {&wide, 8, SQLT_IBDOUBLE}, {&number, 22, SQLT_VNU}, {text, 60, SQLT_STR}};
+        ASSERT_EQ(Prepare("select f, f, f, f from r"), 0);
+        for (ub4 column = 0; column < 4; ++column)
+            ASSERT_EQ(Define(column + 1, {areas[column].at, areas[column].size, areas[column].type}), 0);
+        ASSERT_EQ(Execute(1), 0) << row++;
+        EXPECT_EQ(single, value);
+        EXPECT_EQ(static_cast<float>(wide), value);
+        EXPECT_EQ(std::strtof(text, nullptr), value) << text;
+        EXPECT_LE(std::strlen(text), 42u) << text;
+        double back = 0;
+        ASSERT_EQ(OCINumberToReal(err, &number, 8, &back), OCI_SUCCESS);
+        EXPECT_EQ(back, std::strtod(text, nullptr)) << "the number is what the text says";
+    }
+    EXPECT_EQ(One("select f from r"), "-1.5");
+}
+
+// The sign is in the last half byte: A, C, E, F are plus, B and D minus, a digit there is an error.
+TEST_F(Conversions, SignsOfPackedDecimals) {
+    const struct { char last; const char* seen; } cases[] = {
+        {'\x5A', "12345"}, {'\x5B', "-12345"}, {'\x5C', "12345"}, {'\x5D', "-12345"}, {'\x5E', "12345"},
+        {'\x5F', "12345"}, {'\x59', "!1413"}, {'\xAC', "!1413"}};
+    for (const auto& c : cases)
+        EXPECT_EQ(In(std::string("\x12\x34") + c.last, SQLT_PDN, "to_char(:1)"), c.seen) << Hex(std::string(1, c.last));
 }
 
 TEST_F(Conversions, PackedDecimalWithScale) {
@@ -304,10 +352,11 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
 
 TEST_F(Conversions, SizesThatATypeCannotHave) {
     const struct { ub2 type; sb4 size; sb4 answer; } cases[] = {
-        {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, 0, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483},
+        {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483},
         {SQLT_FLT, 2, 1483}, {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0},
         {SQLT_DAT, 6, 1483},
-        {SQLT_ODT, 7, 1483}, {SQLT_BFLOAT, 7, 1483}, {SQLT_BDOUBLE, 8, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483},
+        {SQLT_ODT, 7, 1483}, {SQLT_BFLOAT, 7, 1483}, {SQLT_BFLOAT, 5, 1483}, {SQLT_BFLOAT, 4, 0}, {SQLT_BDOUBLE, 8, 0},
+        {SQLT_BDOUBLE, 9, 1483}, {SQLT_NUM, 0, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483},
         {SQLT_CHR, -1, 1459}, {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459},
         {SQLT_LVC, 3, 1459},
         {SQLT_BIN, -5, 1459}, {SQLT_VBI, 1, 1459}, {SQLT_VST, 4, 1483}, {SQLT_VST, 0, 0}, {SQLT_RSET, -1, 0},

@@ -1,0 +1,95 @@
+#include "statements/bind_rows.h"
+
+#include <algorithm>
+
+#include "handles/errors.h"
+#include "values/in_rows.h"
+
+namespace {
+
+// What the pieces made: text of a terminated type ends at the zero.
+int LoadCollected(BindArea& bind, engine::Datum& value) {
+    value.kind = engine::Kind::null;
+    if (bind.collected_null) return 0;
+    std::string_view data = bind.collected;
+    if (bind.Type()->family != values::Family::text) return values::FromWholeBytes(data, bind.workspace, value);
+    if (bind.Type()->code == SQLT_STR && !bind.workspace.utf16) data = data.substr(0, data.find('\0'));
+    return values::FromWholeText(data, bind.workspace, value);
+}
+
+}  // namespace
+
+Status BindRows::Collect(const BoundText& text, const sql::EngineText& sql) {
+    table_element = 0;
+    const auto& placeholders = sql.placeholders;
+    for (const std::uint32_t placeholder : placeholders)
+        if (!text.IsBound(placeholder)) return Error(errors::kNotAllBound);
+    if (collected_ == text.Changes()) return {};
+    collected_ = 0;
+    has_tables_ = false;
+    slots_.clear();
+    slots_.reserve(placeholders.size());
+    for (const std::uint32_t placeholder : placeholders) {
+        BindArea* bind = text.At(placeholder).get();
+        const sql::Placeholder& named = text.Scanned().placeholders[placeholder];
+        const auto first = std::lower_bound(placeholders.begin(), placeholders.end(), named.first);
+        auto same_as = static_cast<std::size_t>(first - placeholders.begin());
+        if (same_as >= slots_.size() || slots_[same_as].bind != bind) same_as = slots_.size();
+        slots_.push_back({bind, same_as, named.is_row_id});
+        has_tables_ |= bind->IsTable();
+    }
+    collected_ = text.Changes();
+    return {};
+}
+
+void KindsOf(const BoundText& text, const sql::EngineText& sql, std::vector<engine::Kind>& kinds) {
+    kinds.clear();
+    for (const std::uint32_t placeholder : sql.placeholders) {
+        engine::Kind kind = engine::Kind::null;
+        if (text.IsBound(placeholder)) {
+            const BindArea& bind = *text.At(placeholder);
+            kind = values::KindOf(*bind.Type(), bind.elements.size);
+        }
+        const bool as_row_id = kind == engine::Kind::text && text.Scanned().placeholders[placeholder].is_row_id;
+        kinds.push_back(as_row_id ? engine::Kind::row_id : kind);
+    }
+}
+
+Status BindRows::Row(std::uint32_t row, std::span<engine::Datum> values) {
+    for (std::size_t index = 0; index < slots_.size(); ++index) {
+        const Slot& slot = slots_[index];
+        const bool again = slot.same_as != index && slots_[slot.same_as].is_row_id == slot.is_row_id;
+        if (again) {
+            values[index] = values[slot.same_as];
+        } else if (const int error = Load(slot, row, values[index])) {
+            return Error(error);
+        }
+        const bool too_narrow = !widened_.empty() && widened_[index] == engine::Kind::decimal;
+        if (too_narrow && values[index].kind == engine::Kind::integer)
+            values::Widen(values[index], slot.bind->workspace);
+    }
+    return {};
+}
+
+int BindRows::Load(const Slot& slot, std::uint32_t row, engine::Datum& value) const {
+    BindArea& bind = *slot.bind;
+    const std::uint32_t element = bind.IsTable() ? table_element : row;
+    const int error = bind.InPieces()
+                          ? LoadCollected(bind, value)
+                          : values::Load(bind.elements, element, bind.Type()->in, bind.workspace, value);
+    if (error != 0 || !slot.is_row_id || value.kind != engine::Kind::text) return error;
+    return values::RowIdFromText(bind.workspace, value);
+}
+
+Status BindRows::TableElements(std::uint32_t& count) const {
+    bool first = true;
+    for (const Slot& slot : slots_) {
+        if (!slot.bind->IsTable()) continue;
+        const ub4 elements = *slot.bind->current_elements;
+        if (elements > slot.bind->most_elements) return Error(errors::kBadTableLength);
+        if (!first && elements != count) return Error(errors::kTablesDiffer);
+        count = elements;
+        first = false;
+    }
+    return {};
+}

@@ -1,0 +1,65 @@
+#include "statements/defines.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "handles/errors.h"
+
+std::shared_ptr<DataArea> Defines::At(ub4 position) const {
+    return position <= made_.size() ? made_[position - 1] : nullptr;
+}
+
+void Defines::Put(ub4 position, const std::shared_ptr<DataArea>& area, const Object& statement) noexcept {
+    changed_ = true;
+    const std::shared_ptr<DataArea> before = std::exchange(made_[position - 1], area);
+    if (before && before != area) ReleaseArea(*before, statement);
+}
+
+void Defines::Retire(const Object& statement) noexcept {
+    changed_ = true;
+    active_.clear();
+    for (const auto& area : std::exchange(retired_, std::exchange(made_, {})))
+        if (area && !area->Owner()) ReleaseArea(*area, statement);
+    for (const auto& area : retired_)
+        if (area) area->SetOwner(nullptr);
+}
+
+void Defines::LetLoose(const StatementShare* share) noexcept {
+    for (const auto& area : made_)
+        if (area) area->Leave(share);
+}
+
+bool Defines::AllLive() const {
+    return std::all_of(active_.begin(), active_.end(), [](const Active& active) { return active.area->HasHandle(); });
+}
+
+Status Defines::Activate(const std::vector<engine::Column>& columns) {
+    if (!changed_ && AllLive()) return {};
+    changed_ = true;
+    active_.clear();
+    in_pieces_ = false;
+    for (std::uint32_t index = 0; index < made_.size(); ++index) {
+        const std::shared_ptr<DataArea>& area = made_[index];
+        if (!area || !area->HasHandle()) continue;
+        if (index >= columns.size()) return Error(errors::kNoSuchColumn);
+        area->workspace.column = values::ClassOf(columns[index].type);
+        Active& active = active_.emplace_back(Active{area, index, {}, {}});
+        active.converters = values::ForColumn(*area->Type()->out, area->workspace.column);
+        if (area->InPieces()) active.renderers = values::ForColumn(*area->Type()->pieces, area->workspace.column);
+        in_pieces_ |= area->InPieces();
+    }
+    if (active_.empty()) return Error(errors::kNoDefines);
+    changed_ = false;
+    return {};
+}
+
+int Defines::StoreRow(std::size_t index, std::span<const engine::Datum> row) const {
+    int worst = 0;
+    for (const Active& active : active_) {
+        DataArea& area = *active.area;
+        if (area.InPieces()) continue;
+        const int error = values::Store(area.elements, index, active.converters, area.workspace, row[active.column]);
+        if (error != 0 && (worst == 0 || worst == errors::kTruncationWarning)) worst = error;
+    }
+    return worst;
+}

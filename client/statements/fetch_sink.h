@@ -1,0 +1,19 @@
+// Where fetched rows go: into the defines, and what is taken in pieces to the piece stream.
+#pragma once
+
+#include "statements/statement.h"
+
+class Statement::FetchSink final : public engine::RowSink {
+public:
+    // `first` is the element of the first row.
+    FetchSink(Statement& statement, ub4 first, bool in_pieces)
+        : statement_(statement), index_(first), in_pieces_(in_pieces) {}
+    Status Row(std::uint32_t execution, std::span<const engine::Datum> values) override;
+    [[nodiscard]] Status Warned() const { return warning_; }    // 24345 when a value was cut
+
+private:
+    Statement& statement_;
+    ub4 index_;
+    const bool in_pieces_;
+    Status warning_;
+};
