@@ -3,8 +3,10 @@
 
 #include <algorithm>
 #include <cctype>
+#include <deque>
 #include <initializer_list>
 #include <string>
+#include <utility>
 
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/operands.h"
@@ -106,13 +108,13 @@ private:
         std::size_t at = verb + 1;
         while (at < pieces_.size() && at < verb + 4 && !Is(at, "into")) ++at;
         if (!Is(at, "into")) return;
-        at = ReadTable(database_, pieces_, at + 1, columns_);
+        at = ReadTableName(pieces_, at + 1, table_);
         if (Is(at, "as")) at += 2;
         Columns targets;
         if (Is(at, "(")) {
             at = ReadNames(at, targets);
         } else {
-            for (const TableColumn& column : columns_) targets.push_back(&column);
+            for (TableColumn& column : InsertableColumns(database_, table_)) targets.push_back(&Keep(std::move(column)));
         }
         if (Is(at, "values")) InsertValues(at + 1, targets);
         else if (Is(at, "select") || Is(at, "with")) InsertQuery(at, targets);
@@ -122,12 +124,20 @@ private:
     }
 
     // The columns named in the list that opens at `open`; answers where the text goes on behind it.
-    std::size_t ReadNames(std::size_t open, Columns& columns) const {
+    std::size_t ReadNames(std::size_t open, Columns& columns) {
         std::size_t at = open + 1;
         for (; at < pieces_.size() && !Is(at, ")"); ++at) {
-            if (!Is(at, ",")) columns.push_back(FindColumn(columns_, pieces_[at]));
+            if (!Is(at, ",")) columns.push_back(FindColumn(pieces_[at]));
         }
         return at + 1;
+    }
+
+    TableColumn& Keep(TableColumn column) { return columns_.emplace_back(std::move(column)); }
+
+    // Null when the table has no such column.
+    const TableColumn* FindColumn(std::string_view name) {
+        TableColumn column;
+        return ReadColumn(database_, table_, name, column) ? &Keep(std::move(column)) : nullptr;
     }
 
     void InsertValues(std::size_t at, const Columns& targets) {
@@ -184,7 +194,7 @@ private:
     }
 
     void Update(std::size_t verb) {
-        const std::size_t at = ReadTable(database_, pieces_, Is(verb + 1, "or") ? verb + 3 : verb + 1, columns_);
+        const std::size_t at = ReadTableName(pieces_, Is(verb + 1, "or") ? verb + 3 : verb + 1, table_);
         Set(FindWord(at, {"set"}));
     }
 
@@ -194,7 +204,7 @@ private:
             const std::size_t end =
                 FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", "on", ";"});
             if (Is(at + 1, "(")) SetRow(at + 1);
-            else if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(columns_, pieces_[at + 1]));
+            else if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(pieces_[at + 1]));
             at = end;
         }
     }
@@ -243,7 +253,8 @@ private:
     std::string_view sql_;
     const std::vector<std::string_view>& pieces_;
     ValueTargets& targets_;
-    std::vector<TableColumn> columns_;
+    TableName table_;                   // that is changed
+    std::deque<TableColumn> columns_;    // of it, as far as they are named
 };
 
 }  // namespace

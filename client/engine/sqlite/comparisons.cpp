@@ -69,7 +69,7 @@ private:
         std::size_t scope = 0;
         bool is_target = false;    // of an insert
         std::string name;          // its alias, if it has one
-        std::vector<TableColumn> columns;
+        TableName table;
         std::size_t query = 0;                  // where a subquery begins; 0: a table
         std::vector<std::string_view> names;    // of a subquery's columns, where WITH tells them
     };
@@ -164,8 +164,7 @@ private:
             TableColumn answered;
             answered.declared = type.declared;
             answered.concerned = ReadDeclaredType(type.declared, answered.column);
-            answers_.push_back(std::move(answered));
-            column = &answers_.back();
+            column = &columns_.emplace_back(std::move(answered));
         }
         return column && IsDateType(column->column.type) ? column : nullptr;
     }
@@ -256,8 +255,9 @@ private:
 
     Found ColumnOf(const Table& table, std::string_view name) {
         if (table.query == 0) {
-            const TableColumn* column = FindColumn(table.columns, name);
-            return {column != nullptr, column};
+            TableColumn column;
+            if (!ReadColumn(database_, table.table, name, column)) return {};
+            return {true, &columns_.emplace_back(std::move(column))};
         }
         constexpr int kDeepest = 30;       // a recursive query looks into itself
         constexpr int kMostLooks = 1000;   // subqueries that join each other twice and twice again
@@ -391,8 +391,8 @@ private:
                 table.query = at + 1;
                 at = operands_.Partner(at) + 1;
             } else {
-                at = ReadTable(database_, pieces_, at, table.columns);
-                table.name = PlainName(At(at - 1));
+                at = ReadTableName(pieces_, at, table.table);
+                table.name = table.table.name;
                 UseWith(table);
             }
             if (IsWord(At(at), "as")) ++at;
@@ -406,7 +406,6 @@ private:
     void UseWith(Table& table) const {
         for (const With& with : withs_) {
             if (sqlite3_stricmp(with.name.c_str(), table.name.c_str()) != 0) continue;
-            table.columns.clear();
             table.query = with.query;
             table.names = with.names;
         }
@@ -425,7 +424,7 @@ private:
     std::vector<With> withs_;
     int depth_ = 0;                       // of subqueries looked into, and how many for one name
     int looks_ = 0;
-    std::deque<TableColumn> answers_;     // of calls
+    std::deque<TableColumn> columns_;     // that were told of, and what calls answer
 };
 
 }  // namespace

@@ -2,6 +2,7 @@
 #include "engine/sqlite/describe.h"
 
 #include <algorithm>
+#include <new>
 
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/connection.h"
@@ -115,17 +116,27 @@ bool IsNullable(sqlite3* database, sqlite3_stmt* statement, int index) {
 class WrittenNames {
 public:
     WrittenNames(sqlite3* database, sqlite3_stmt* statement, std::string_view sql) : statement_(statement) {
-        if (sqlite3_sql(statement) == sql) return;
+        if (sqlite3_sql(statement) == sql || !HasChanged(sql)) return;
         sqlite3_stmt* compiled = nullptr;
         sqlite3_prepare_v2(database, sql.data(), static_cast<int>(sql.size()), &compiled, nullptr);
         written_.reset(compiled);
     }
     const char* Name(int index) const {
         sqlite3_stmt* named = index < sqlite3_column_count(written_.get()) ? written_.get() : statement_;
-        return sqlite3_column_name(named, index);
+        const char* name = sqlite3_column_name(named, index);
+        return name ? name : throw std::bad_alloc();
     }
 
 private:
+    // Whether a name is an expression that does not stand in the text.
+    bool HasChanged(std::string_view sql) const {
+        for (int index = 0; index < sqlite3_column_count(statement_); ++index) {
+            const std::string_view name = Name(index);
+            if (name.find_first_of(" ('=<>") != name.npos && sql.find(name) == sql.npos) return true;
+        }
+        return false;
+    }
+
     sqlite3_stmt* statement_;
     StatementHandle written_;
 };

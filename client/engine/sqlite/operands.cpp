@@ -2,20 +2,23 @@
 #include "engine/sqlite/operands.h"
 
 #include <algorithm>
+#include <array>
+#include <cctype>
 
 #include "engine/sqlite/pieces.h"
 
 namespace engine::sqlite {
 namespace {
 
+// In order.
 constexpr std::string_view kKeywords[] = {
-    "all",     "and",    "as",     "asc",    "between", "by",      "case",      "check",   "collate", "cross",
-    "default", "delete", "desc",   "distinct", "do",    "else",    "end",       "escape",  "except",  "exists",
-    "filter",  "from",   "full",   "glob",   "group",   "having",  "in",        "inner",   "insert",  "intersect",
-    "into",    "is",     "isnull", "join",   "left",    "like",    "limit",     "match",   "natural", "not",
-    "notnull", "null",   "nulls",  "offset", "on",      "or",      "order",     "outer",   "over",    "partition",
-    "regexp",  "returning", "right", "select", "set",   "then",    "union",     "update",  "using",   "values",
-    "when",    "where",  "window", "with"};
+    "all", "and", "as", "asc", "between", "by", "case", "check", "collate", "cross", "default", "delete", "desc",
+    "distinct", "do", "else", "end", "escape", "except", "exists", "filter", "from", "full", "glob", "group",
+    "having", "in", "inner", "insert", "intersect", "into", "is", "isnull", "join", "left", "like", "limit", "match",
+    "natural", "not", "notnull", "null", "nulls", "offset", "on", "or", "order", "outer", "over", "partition",
+    "regexp", "returning", "right", "select", "set", "then", "union", "update", "using", "values", "when", "where",
+    "window", "with"};
+constexpr std::size_t kLongestKeyword = 9;
 
 constexpr std::string_view kArithmetic[] = {"+", "-", "*", "/", "%", "&", "|", "||", "<<", ">>", "->", "->>"};
 
@@ -27,7 +30,11 @@ bool Contains(const List& list, std::string_view piece) {
 }  // namespace
 
 bool IsKeyword(std::string_view piece) {
-    return std::any_of(std::begin(kKeywords), std::end(kKeywords), [&](auto word) { return IsWord(piece, word); });
+    std::array<char, kLongestKeyword> lower;
+    if (piece.empty() || piece.size() > lower.size() || !std::isalpha(static_cast<unsigned char>(piece[0]))) return false;
+    std::transform(piece.begin(), piece.end(), lower.begin(),
+                   [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
+    return std::binary_search(std::begin(kKeywords), std::end(kKeywords), std::string_view(lower.data(), piece.size()));
 }
 
 bool IsComparison(std::string_view piece) {

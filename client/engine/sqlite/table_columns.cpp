@@ -14,54 +14,98 @@
 namespace engine::sqlite {
 namespace {
 
-std::vector<TableColumn> ReadColumns(sqlite3* database, const std::string& schema, const std::string& table) {
-    std::vector<TableColumn> columns;
+StatementHandle Compile(sqlite3* database, const std::string& sql) {
     sqlite3_stmt* compiled = nullptr;
-    const char* sql = schema.empty() ? "select name, type from pragma_table_info(?1)"
-                                     : "select name, type from pragma_table_info(?1, ?2)";
-    if (sqlite3_prepare_v2(database, sql, -1, &compiled, nullptr) == SQLITE_NOMEM) throw std::bad_alloc();
-    const StatementHandle statement(compiled);
-    if (!compiled) return columns;
-    sqlite3_bind_text(compiled, 1, table.data(), static_cast<int>(table.size()), SQLITE_STATIC);
-    if (!schema.empty()) sqlite3_bind_text(compiled, 2, schema.data(), static_cast<int>(schema.size()), SQLITE_STATIC);
-    int code = SQLITE_OK;
-    while ((code = sqlite3_step(compiled)) == SQLITE_ROW) {
-        const auto* name = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
-        const auto* declared = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 1));
-        if (!name || !declared) throw std::bad_alloc();
-        TableColumn column;
-        column.name = name;
-        column.declared = declared;
-        column.concerned = ReadDeclaredType(column.declared, column.column) && Coercion::Concerns(column.column);
-        column.column.name = UpperCase(column.name);
-        columns.push_back(std::move(column));
+    if (sqlite3_prepare_v2(database, sql.c_str(), static_cast<int>(sql.size()), &compiled, nullptr) == SQLITE_NOMEM)
+        throw std::bad_alloc();
+    return StatementHandle(compiled);
+}
+
+TableColumn Described(const char* name, const char* declared) {
+    if (!name) throw std::bad_alloc();
+    TableColumn column;
+    column.name = name;
+    column.declared = declared ? declared : "";
+    column.concerned = ReadDeclaredType(column.declared, column.column) && Coercion::Concerns(column.column);
+    column.column.name = UpperCase(column.name);
+    return column;
+}
+
+std::string Quoted(const std::string& name) {
+    std::string quoted = "\"";
+    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
+    return quoted += '"';
+}
+
+bool IsRowId(const std::string& name) {
+    constexpr const char* kNames[] = {"rowid", "oid", "_rowid_"};
+    return std::any_of(std::begin(kNames), std::end(kNames),
+                       [&](const char* row_id) { return sqlite3_stricmp(name.c_str(), row_id) == 0; });
+}
+
+// A column of a view, or one that is called like a row id: a compiled query tells them.
+bool ReadByQuery(sqlite3* database, const TableName& table, const std::string& name, TableColumn& column) {
+    const std::string schema = table.schema.empty() ? "" : Quoted(table.schema) + '.';
+    const StatementHandle query = Compile(database, "select * from " + schema + Quoted(table.name));
+    for (int index = 0; index < sqlite3_column_count(query.get()); ++index) {
+        if (sqlite3_stricmp(sqlite3_column_name(query.get(), index), name.c_str()) != 0) continue;
+        column = Described(sqlite3_column_name(query.get(), index), sqlite3_column_decltype(query.get(), index));
+        return true;
     }
+    return false;
+}
+
+// SQLite's answer about a table that is no view, or its column; `declared` is set on success.
+int Ask(sqlite3* database, const TableName& table, const char* column, const char*& declared) {
+    const int code =
+        sqlite3_table_column_metadata(database, table.schema.empty() ? nullptr : table.schema.c_str(),
+                                      table.name.c_str(), column, &declared, nullptr, nullptr, nullptr, nullptr);
     if ((code & 0xFF) == SQLITE_NOMEM) throw std::bad_alloc();
-    return columns;
+    return code;
 }
 
 }  // namespace
 
-std::size_t ReadTable(sqlite3* database, const std::vector<std::string_view>& pieces, std::size_t at,
-                      std::vector<TableColumn>& columns) {
-    columns.clear();
+std::size_t ReadTableName(const std::vector<std::string_view>& pieces, std::size_t at, TableName& table) {
+    table = {};
     if (at >= pieces.size()) return at;
-    std::string schema;
-    std::string name = PlainName(pieces[at++]);
+    table.name = PlainName(pieces[at++]);
     if (at + 1 < pieces.size() && pieces[at] == ".") {
-        schema = std::exchange(name, PlainName(pieces[at + 1]));
+        table.schema = std::exchange(table.name, PlainName(pieces[at + 1]));
         at += 2;
     }
-    columns = ReadColumns(database, schema, name);
     return at;
 }
 
-const TableColumn* FindColumn(const std::vector<TableColumn>& columns, std::string_view name) {
+bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name, TableColumn& column) {
     const std::string plain = PlainName(name);
-    const auto found = std::find_if(columns.begin(), columns.end(), [&](const TableColumn& column) {
-        return sqlite3_stricmp(column.name.c_str(), plain.c_str()) == 0;
-    });
-    return found == columns.end() ? nullptr : &*found;
+    const char* declared = nullptr;
+    if (!IsRowId(plain)) {
+        if (Ask(database, table, plain.c_str(), declared) == SQLITE_OK) {
+            column = Described(plain.c_str(), declared);
+            return true;
+        }
+        if (Ask(database, table, nullptr, declared) == SQLITE_OK) return false;
+    }
+    return ReadByQuery(database, table, plain, column);
+}
+
+// The engine's own list leaves out those that are calculated.
+std::vector<TableColumn> InsertableColumns(sqlite3* database, const TableName& table) {
+    std::vector<TableColumn> columns;
+    const StatementHandle list =
+        Compile(database, "select name, type from pragma_table_info(" + Literal(table.name) +
+                              (table.schema.empty() ? "" : ", " + Literal(table.schema)) + ")");
+    if (!list) return columns;
+    int code = SQLITE_OK;
+    while ((code = sqlite3_step(list.get())) == SQLITE_ROW) {
+        const auto text = [&](int index) {
+            return reinterpret_cast<const char*>(sqlite3_column_text(list.get(), index));
+        };
+        columns.push_back(Described(text(0), text(1)));
+    }
+    if ((code & 0xFF) == SQLITE_NOMEM) throw std::bad_alloc();
+    return columns;
 }
 
 std::string UpperCase(std::string text) {

@@ -12,6 +12,11 @@
 
 namespace engine::sqlite {
 
+struct TableName {
+    std::string schema;    // empty: any
+    std::string name;
+};
+
 struct TableColumn {
     std::string name;
     std::string declared;    // its type's words
@@ -19,13 +24,14 @@ struct TableColumn {
     bool concerned = false;  // values for the column are looked at
 };
 
-// Reads the name of a table, "name" or "schema.name", at pieces[at], and the columns of that table, none when there is
-// no such table. Answers where the text goes on.
-std::size_t ReadTable(sqlite3* database, const std::vector<std::string_view>& pieces, std::size_t at,
-                      std::vector<TableColumn>& columns);
+// Reads the name of a table, "name" or "schema.name", at pieces[at]. Answers where the text goes on.
+std::size_t ReadTableName(const std::vector<std::string_view>& pieces, std::size_t at, TableName& table);
 
-// The column of that name, which may be quoted; null when there is none.
-const TableColumn* FindColumn(const std::vector<TableColumn>& columns, std::string_view name);
+// The column of that name, which may be quoted, of a table or view; false when there is none. A row id is none.
+bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name, TableColumn& column);
+
+// The columns that an insert without names gives values to, in their order; none when there is no such table.
+std::vector<TableColumn> InsertableColumns(sqlite3* database, const TableName& table);
 
 std::string UpperCase(std::string text);
 
