@@ -124,9 +124,9 @@ TEST_F(Sessions, PasswordIsChangedForGoodOrNotAtAll) {
     ASSERT_EQ(Run("insert into t values(1)"), 0);
     EXPECT_EQ(ChangePassword("ann", "secret", "new"), 24754);
     EXPECT_EQ(Run("update kelp_accounts set password = ''"), 1031);
-    ASSERT_EQ(Answer(OCITransRollback(svc_, err_, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Run("rollback"), 0);
     EXPECT_EQ(ChangePassword("ann", "secret", "new"), 0);
-    ASSERT_EQ(Answer(OCITransRollback(svc_, err_, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Run("rollback"), 0);
     ASSERT_EQ(Answer(OCILogoff(svc_, err_)), 0);
     EXPECT_EQ(LogOn("ann", "secret", file), 1017);
     ASSERT_EQ(LogOn("ann", "new", file), 0);
@@ -143,7 +143,7 @@ TEST_F(Sessions, BreakMeetsOneCall) {
     EXPECT_EQ(Answer(OCIReset(svc_, err_)), 0);
     EXPECT_EQ(Run("insert into t values(1)"), 0);
     EXPECT_EQ(Answer(OCIBreak(svc_, err_)), 0);
-    EXPECT_EQ(Answer(OCITransCommit(svc_, err_, OCI_DEFAULT)), 0) << "what ends a transaction is not stopped";
+    EXPECT_EQ(Run("commit"), 0) << "what ends a transaction is not stopped";
     EXPECT_EQ(Run("insert into t values(2)"), 1013);
     EXPECT_EQ(Number("select count(*) from t"), 1);
     ASSERT_EQ(Answer(OCILogoff(svc_, err_)), 0);
