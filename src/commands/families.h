@@ -10,6 +10,7 @@ void AddBufferCommands(HandlerTable& handlers);
 void AddConvenienceCommands(HandlerTable& handlers);
 void AddDateCommands(HandlerTable& handlers);
 void AddDateTimeCommands(HandlerTable& handlers);
+void AddDescribeCommands(HandlerTable& handlers);
 void AddDynamicCommands(HandlerTable& handlers);
 void AddEnvironmentCommands(HandlerTable& handlers);
 void AddErrorCommands(HandlerTable& handlers);
@@ -33,6 +34,7 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddConvenienceCommands,
     AddDateCommands,
     AddDateTimeCommands,
+    AddDescribeCommands,
     AddDynamicCommands,
     AddEnvironmentCommands,
     AddErrorCommands,
