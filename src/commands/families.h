@@ -17,6 +17,8 @@ void AddErrorCommands(HandlerTable& handlers);
 void AddFetchAllCommand(HandlerTable& handlers);
 void AddFileCommands(HandlerTable& handlers);
 void AddHandleCommands(HandlerTable& handlers);
+void AddLobCommands(HandlerTable& handlers);
+void AddLobTransferCommands(HandlerTable& handlers);
 void AddNumberCommands(HandlerTable& handlers);
 void AddRowidCommands(HandlerTable& handlers);
 void AddSessionCommands(HandlerTable& handlers);
@@ -41,6 +43,8 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddFetchAllCommand,
     AddFileCommands,
     AddHandleCommands,
+    AddLobCommands,
+    AddLobTransferCommands,
     AddNumberCommands,
     AddRowidCommands,
     AddSessionCommands,
