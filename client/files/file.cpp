@@ -22,7 +22,7 @@ constexpr struct { int error; int number; } kSystemErrors[] = {
     {EIO, errors::kFileInputOutput},        {ENOSPC, errors::kFileNoSpace},   {EDQUOT, errors::kFileNoSpace},
     {EACCES, errors::kAccessDenied},        {EPERM, errors::kAccessDenied},   {EROFS, errors::kAccessDenied},
     {EISDIR, errors::kIsDirectory},         {EFBIG, errors::kFileTooLarge},
-    {EOVERFLOW, errors::kFileTooLarge}};
+    {EOVERFLOW, errors::kFileTooLarge},     {ENOMEM, errors::kOutOfMemory}};
 
 Status SystemError(const std::string& name, int error) {
     int number = errors::kCannotAccess;
@@ -39,13 +39,19 @@ constexpr const char* kStreamModes[] = {nullptr, "r", "w", "r+"};
 constexpr const char* kAppendingModes[] = {nullptr, "r", "a", "a+"};
 constexpr int kAccessModes[] = {0, O_RDONLY, O_WRONLY, O_RDWR};
 
+// Emptying is left for when nothing else can fail.
 int OpenFlags(std::uint32_t mode, std::uint32_t create) {
     int flags = kAccessModes[mode] | O_CLOEXEC;
     if (create != OCI_FILE_EXIST) flags |= O_CREAT;
     if (create & OCI_FILE_EXCL) flags |= O_EXCL;
-    if (create & OCI_FILE_TRUNCATE) flags |= O_TRUNC;
     if (create & OCI_FILE_APPEND) flags |= O_APPEND;
     return flags;
+}
+
+// Empties a file; pipes and devices hold nothing.
+bool Empty(const std::string& name, int descriptor, std::uint32_t mode) {
+    const int failed = mode & OCI_FILE_WRITE_ONLY ? ftruncate(descriptor, 0) : truncate(name.c_str(), 0);
+    return failed == 0 || errno == EINVAL;
 }
 
 bool IsDirectory(int descriptor) {
@@ -92,9 +98,11 @@ Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t cre
     if (!stream) {
         const int error = errno;
         close(descriptor);
+        if (create & OCI_FILE_EXCL) unlink(name.c_str());    // nobody else's
         return SystemError(name, error);
     }
-    return Use(stream, mode, false);
+    Status status = Use(stream, mode, false);    // who owns it closes it
+    return (create & OCI_FILE_TRUNCATE) && !Empty(name, descriptor, mode) ? SystemError(name, errno) : status;
 }
 
 int File::GiveUpStream() noexcept {
