@@ -39,26 +39,30 @@ void ErrorList::List(const Status& status) noexcept try {
     const int alone = state_.exchange(kListed, std::memory_order_relaxed);
     if (alone != kListed) records_.clear();    // what a thread listed while another emptied the list
     if (alone > 0) records_.push_back({alone, Status::kClient, {}});
+    if (alone == kSpare) records_.push_back({spare_.Number(), spare_.Engine(), {}});
     records_.push_back(std::move(record));
 } catch (const std::bad_alloc&) {
+    const std::lock_guard lock(mutex_);
     int none = kNone;
-    state_.compare_exchange_strong(none, status.Number(), std::memory_order_relaxed);
+    if (state_.compare_exchange_strong(none, kSpare, std::memory_order_relaxed)) spare_ = status;
 }
 
 void ErrorList::TakeFrom(ErrorList& other) noexcept {
     const int state = other.state_.exchange(kNone, std::memory_order_relaxed);
     Clear();
-    if (state != kListed) return state_.store(state, std::memory_order_relaxed);
+    if (state != kListed && state != kSpare) return state_.store(state, std::memory_order_relaxed);
     const std::scoped_lock lock(mutex_, other.mutex_);
     records_ = std::exchange(other.records_, {});
-    state_.store(kListed, std::memory_order_relaxed);
+    spare_ = other.spare_;
+    state_.store(state, std::memory_order_relaxed);
 }
 
 std::optional<ErrorList::Record> ErrorList::At(std::size_t position) const {
     const int state = state_.load(std::memory_order_relaxed);
     if (state > 0 && position == 1) return Record{state, Status::kClient, {}};
-    if (state != kListed) return std::nullopt;
+    if (state != kListed && state != kSpare) return std::nullopt;
     const std::lock_guard lock(mutex_);
+    if (state == kSpare && position == 1) return Record{spare_.Number(), spare_.Engine(), spare_.Detail()};
     if (position == 0 || position > records_.size()) return std::nullopt;
     return records_[position - 1];
 }

@@ -20,8 +20,7 @@ std::string_view SqlState(int number) noexcept;
 std::string ErrorMessage(int number, std::string_view engine, std::string_view detail);
 
 // The records of the last call. Recording formats nothing: texts are put together when they are asked for. The first
-// record always finds room: without memory it is kept without the words of its own. Threads that share a list see each
-// other's records, but nothing worse.
+// record always finds room. Threads that share a list see each other's records, but nothing worse.
 class ErrorList {
 public:
     struct Record {
@@ -55,9 +54,11 @@ private:
     // Most calls leave no record, and most that do leave a plain one: neither locks anything.
     static constexpr int kNone = 0;
     static constexpr int kListed = -1;
+    static constexpr int kSpare = -2;    // the only record is spare_
     std::atomic<int> state_{kNone};    // or the number of the only record, a plain one
     mutable std::mutex mutex_;
     std::vector<Record> records_;    // when listed
+    Status spare_;                   // kept where memory was short for a list
 };
 
 class ErrorHandle : public Object {
