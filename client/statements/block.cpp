@@ -5,6 +5,7 @@
 // A block that fails undoes what it did since it last ended a transaction on its way.
 #include <algorithm>
 #include <cstring>
+#include <new>
 
 #include "handles/environment.h"
 #include "handles/errors.h"
@@ -54,7 +55,12 @@ private:
 Status Statement::RunBlock(const ExecuteArguments& arguments) {
     if (arguments.iterations <= arguments.first) return Error(errors::kNoIterations);
     Stretch stretch(Engine());
-    Status status = RunSteps(arguments, stretch);
+    Status status;
+    try {
+        status = RunSteps(arguments, stretch);
+    } catch (const std::bad_alloc&) {
+        status = Error(errors::kOutOfMemory);
+    }
     if (status.Ok()) return stretch.Keep();
     UsedLink()->Answered(status);
     Status undone = stretch.Undo();

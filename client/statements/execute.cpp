@@ -258,8 +258,10 @@ Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments, 
         error.row_offset = outcome.failures.front().row;
         return std::move(outcome.failures.front().status);
     }
+    const bool cut_short = outcome.executed + outcome.failures.size() < arguments.iterations - arguments.first;
+    Status last = cut_short ? outcome.failures.back().status : Status();
     for (auto& failure : outcome.failures) error.row_failures.push_back({failure.row, std::move(failure.status)});
-    return Warning(errors::kRowsFailed);
+    return cut_short ? last : Warning(errors::kRowsFailed);
 }
 
 // ---- Everything else

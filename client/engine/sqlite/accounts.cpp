@@ -142,7 +142,7 @@ Status ChangePassword(SqliteConnection& connection, const std::string& user, con
     if (!Matches(old_password, hash)) return Error(errors::kBadOldPassword);
     const std::string new_hash = Usable(new_password) ? NewHash(new_password) : std::string();
     if (new_hash.empty()) return Error(errors::kBadLogon);
-    connection.ReadAhead(nullptr);
+    (void)connection.ReadAhead(nullptr);
     return Run(connection, "update main.kelp_accounts set password = ?2 where name = ?1", {Folded(user), new_hash},
                nullptr, nullptr);
 }

@@ -130,8 +130,21 @@ std::string SqliteConnection::Encoding() {
 
 // ---- Statements
 
+// Compiling reads of tables, too, and what is read may fail and take the transaction with it.
 Status SqliteConnection::Compile(const StatementSource& source, std::unique_ptr<Query>& query,
                                  std::uint32_t& error_offset) {
+    const bool in_transaction = InTransaction();
+    Status status;
+    try {
+        status = CompileNow(source, query, error_offset);
+    } catch (const std::bad_alloc&) {
+        status = Error(errors::kOutOfMemory).From("SQLITE");
+    }
+    return in_transaction && !InTransaction() ? RolledBack(status) : status;
+}
+
+Status SqliteConnection::CompileNow(const StatementSource& source, std::unique_ptr<Query>& query,
+                                    std::uint32_t& error_offset) {
     const std::string_view sql = source.sql;
     if (sql.size() > kLongestStatement) return Error(errors::kStatementTooLong).From("SQLITE");
     sqlite3* database = Database();
@@ -189,9 +202,10 @@ Status SqliteConnection::Run(Own own) noexcept {
     if (status.Failed()) return status;
     sqlite3_stmt* statement = owns_[static_cast<std::size_t>(own)].get();
     const Resetting resetting(statement);
+    const bool in_transaction = InTransaction();
     errno = 0;
     const int code = sqlite3_step(statement);
-    return code == SQLITE_DONE || code == SQLITE_ROW ? Status() : Failed(code, Verb::other, false);
+    return code == SQLITE_DONE || code == SQLITE_ROW ? Status() : Failed(code, Verb::other, in_transaction);
 }
 
 // ---- Transactions
@@ -202,7 +216,7 @@ Status SqliteConnection::Begin(TransactionMode mode) {
     for (const Own own : {Own::commit, Own::rollback}) {
         if (Status status = CompileOwn(own); status.Failed()) return status;
     }
-    ReadAhead(nullptr);
+    (void)ReadAhead(nullptr);
     read_only_ = mode == TransactionMode::read_only;
     if (mode == TransactionMode::read_write) return Run(Own::begin);
     Status status = Run(Own::begin_reading);
@@ -222,7 +236,6 @@ Status SqliteConnection::Commit() {
     if (!InTransaction()) return {};
     const Unheeding undisturbed(*this);
     Status status = Run(Own::commit);
-    if (!status.Ok() && !InTransaction()) return RolledBack(status);
     if (status.Number() != errors::kParentMissing && status.Number() != errors::kChildFound) return status;
     Status undone = Rollback();
     return undone.Failed() ? undone : Error(errors::kRolledBack, status.Detail()).From("SQLITE");
@@ -231,7 +244,7 @@ Status SqliteConnection::Commit() {
 Status SqliteConnection::Rollback() {
     if (!InTransaction()) return {};
     const Unheeding undisturbed(*this);
-    ReadAhead(nullptr);
+    (void)ReadAhead(nullptr);
     return Run(Own::rollback);
 }
 
@@ -245,7 +258,9 @@ Status SqliteConnection::SetMark() {
 
 Status SqliteConnection::UndoToMark() {
     const Unheeding undisturbed(*this);
-    ReadAhead(nullptr);
+    const bool in_transaction = InTransaction();
+    const Status read = ReadAhead(nullptr);
+    if (in_transaction && !InTransaction()) return RolledBack(read);
     Status status = Run(Own::undo);
     if (status.Ok() || status.Number() == errors::kNoSuchSavepoint) return status;
     Status undone = Rollback();
@@ -279,9 +294,11 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
         began = status.Ok();
         return status;
     }
-    const bool goes_stale = !InTransaction() && !Private();
-    if (!entry.read_only || entry.effect == Effect::controls || goes_stale) ReadAhead(query);
-    return {};
+    const bool in_transaction = InTransaction();
+    const bool goes_stale = !in_transaction && !Private();
+    Status read;
+    if (!entry.read_only || entry.effect == Effect::controls || goes_stale) read = ReadAhead(query);
+    return in_transaction && !InTransaction() ? RolledBack(read) : Status();
 }
 
 void SqliteConnection::Abandon() noexcept { (void)Rollback(); }    // nothing is lost: there was nothing yet
@@ -301,12 +318,17 @@ void SqliteConnection::Leave(SqliteQuery& query) noexcept {
     query.previous_ = query.next_open_ = nullptr;
 }
 
-void SqliteConnection::ReadAhead(const SqliteQuery* except) noexcept {
+Status SqliteConnection::ReadAhead(const SqliteQuery* except) noexcept {
+    Status first;
     for (SqliteQuery* query = first_open_; query;) {
         SqliteQuery* next = query->next_open_;    // reading ahead takes the query off the list
-        if (query != except) query->ReadAhead();
+        if (query != except) {
+            const Status status = query->ReadAhead();
+            if (first.Ok()) first = status;
+        }
         query = next;
     }
+    return first;
 }
 
 // ---- What SQLite asks

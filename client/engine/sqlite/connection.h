@@ -77,7 +77,8 @@ public:
     void Join(SqliteQuery& query) noexcept;     // the query has rows to come
     void Leave(SqliteQuery& query) noexcept;
     // Lets the open queries but `except` read the rest of their rows, so that none holds an old state of the database.
-    void ReadAhead(const SqliteQuery* except) noexcept;
+    // The first failure, of which the fetch that gets there is told: of interest if it has lost the transaction.
+    Status ReadAhead(const SqliteQuery* except) noexcept;
     std::optional<std::int64_t> changed_row;    // the last one, for whoever emptied it before
 
     // While one lives, statements may read and change the accounts.
@@ -108,6 +109,7 @@ private:
     static void OnChange(void* self, int operation, const char* schema, const char* table, sqlite3_int64 row);
     static int OnAccess(void* self, int action, const char* first, const char* second, const char* schema,
                         const char* trigger);
+    Status CompileNow(const StatementSource& source, std::unique_ptr<Query>& query, std::uint32_t& error_offset);
     StatementHandle CompileText(std::string_view sql, int& code, std::size_t* end) noexcept;
     Status CompileOwn(Own own) noexcept;
     Status Run(Own own) noexcept;

@@ -127,9 +127,9 @@ int NumberOf(int code, Verb verb, std::string_view message) {
 // Callers empty errno before the call.
 bool MayNotGrow(int code) { return code == SQLITE_IOERR_WRITE && (errno == EFBIG || errno == EDQUOT); }
 
-Status Told(int number, std::string_view words, std::string_view more = {}) noexcept {
+Status Told(int number, std::string_view words) noexcept {
     try {
-        return Error(number, std::string(words).append(more)).From("SQLITE");
+        return Error(number, std::string(words)).From("SQLITE");
     } catch (const std::bad_alloc&) {
         return Error(number).From("SQLITE");
     }
@@ -140,6 +140,10 @@ Status ToldByFunction(std::string_view words) {
     const std::size_t blank = words.find(' ');
     return Told(std::atoi(words.data()), words.substr(blank + 1));
 }
+
+// Made while there is memory.
+const Status kTransactionLost =
+    Error(errors::kOutOfMemory, "out of memory; the transaction was rolled back").From("SQLITE");
 
 }  // namespace
 
@@ -154,15 +158,14 @@ Status Failure(sqlite3* database, int code, Verb verb) noexcept {
     return Told(number, words);
 }
 
-Status RolledBack(const Status& failure) noexcept {
-    constexpr std::string_view kWords = "the transaction was rolled back";
-    try {
-        std::string detail = failure.Detail();
-        if (!detail.empty()) detail += "; ";
-        return Told(failure.Number(), detail, kWords);
-    } catch (const std::bad_alloc&) {
-        return Error(failure.Number()).From("SQLITE");
-    }
+Status RolledBack(const Status& failure) noexcept try {
+    constexpr std::string_view kLost = "the transaction was rolled back";
+    std::string detail = failure.Detail();
+    if (detail.ends_with(kLost)) return failure;
+    if (!detail.empty()) detail += "; ";
+    return Error(failure.Number(), detail.append(kLost)).From("SQLITE");
+} catch (const std::bad_alloc&) {
+    return kTransactionLost;
 }
 
 }  // namespace engine::sqlite

@@ -19,7 +19,7 @@ enum class Verb : std::uint8_t { other, insert, update, remove };    // what a s
 // has failed all the same.
 Status Failure(sqlite3* database, int code, Verb verb = Verb::other) noexcept;
 
-// A failure that has taken the transaction with it: the record says so, too.
+// A failure that has taken the transaction with it: the record says so, too, even where memory is short (1019 then).
 Status RolledBack(const Status& failure) noexcept;
 
 // The status of a result code that has no database behind it.

@@ -35,8 +35,8 @@ public:
     void Close() noexcept override;
 
     // Reads the rest of an open query's rows into the store and lets go of the database. What fails is kept for the
-    // fetch that gets there.
-    void ReadAhead() noexcept;
+    // fetch that gets there, and answered.
+    Status ReadAhead() noexcept;
 
 private:
     friend class SqliteConnection;
@@ -74,10 +74,9 @@ private:
     void Drain(Status end) noexcept;
 
     void Fill();
-    void FillRowId(int column, Datum& value);
-    void FillDate(int column, Datum& value);
-    void FillNumber(int column, Datum& value);
-    void Pad(int index, Datum& value);
+    void FillText(std::size_t column, sqlite3_value* stored, Datum& value);
+    void FillBlob(std::size_t column, sqlite3_value* stored, Datum& value);
+    void Pad(std::size_t column, Datum& value);
 
     static Reading ReadingOf(const Column& column);
     void Describe();
