@@ -10,15 +10,12 @@ void AddBufferCommands(HandlerTable& handlers);
 void AddConvenienceCommands(HandlerTable& handlers);
 void AddDateCommands(HandlerTable& handlers);
 void AddDateTimeCommands(HandlerTable& handlers);
-void AddDescribeCommands(HandlerTable& handlers);
 void AddDynamicCommands(HandlerTable& handlers);
 void AddEnvironmentCommands(HandlerTable& handlers);
 void AddErrorCommands(HandlerTable& handlers);
 void AddFetchAllCommand(HandlerTable& handlers);
 void AddFileCommands(HandlerTable& handlers);
 void AddHandleCommands(HandlerTable& handlers);
-void AddLobCommands(HandlerTable& handlers);
-void AddLobTransferCommands(HandlerTable& handlers);
 void AddNumberCommands(HandlerTable& handlers);
 void AddRowidCommands(HandlerTable& handlers);
 void AddSessionCommands(HandlerTable& handlers);
@@ -36,15 +33,12 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddConvenienceCommands,
     AddDateCommands,
     AddDateTimeCommands,
-    AddDescribeCommands,
     AddDynamicCommands,
     AddEnvironmentCommands,
     AddErrorCommands,
     AddFetchAllCommand,
     AddFileCommands,
     AddHandleCommands,
-    AddLobCommands,
-    AddLobTransferCommands,
     AddNumberCommands,
     AddRowidCommands,
     AddSessionCommands,

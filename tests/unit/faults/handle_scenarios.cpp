@@ -1,0 +1,190 @@
+// Environments, handles and descriptors, logons, accounts, error records.
+#include <cstring>
+#include <filesystem>
+
+#include "faults/scenarios.h"
+
+namespace faults {
+namespace {
+
+void CreateEnvironment(World& w, ub4 mode = OCI_DEFAULT) {
+    w.Step("OCIEnvCreate", [&] {
+        return OCIEnvCreate(&w.env, mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 16,
+                            nullptr);
+    }, Told::code);
+    w.AtEnd([&w] {
+        OCIEnv* const env = std::exchange(w.env, nullptr);
+        w.err = nullptr;
+        return OCIHandleFree(env, OCI_HTYPE_ENV);
+    });
+    w.err = w.New<OCIError>(OCI_HTYPE_ERROR);
+}
+
+void LogOn(World& w, std::string_view user, std::string_view password, std::string_view database) {
+    w.Step("OCILogon", [&] {
+        return OCILogon(w.env, w.err, &w.svc, user.empty() ? nullptr : World::Text(user), World::Size(user),
+                        user.empty() ? nullptr : World::Text(password), World::Size(password), World::Text(database),
+                        World::Size(database));
+    });
+    w.AtEnd([&w] { return OCILogoff(std::exchange(w.svc, nullptr), w.err); });
+}
+
+// A statement from nothing to its first row.
+void FromNothing(World& w) {
+    CreateEnvironment(w);
+    LogOn(w, "", "", ":memory:");
+    w.stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
+    w.Prepare("select 'abc' from dual");
+    char text[4] = "";
+    w.Define(1, {text, 4, SQLT_STR});
+    w.Execute(1);
+    w.See(text);
+}
+
+// Frees nothing but what was made undisturbed: an end takes no memory, even as a thread's first call.
+void FreeingTakesNoMemory(World& w) {
+    OCIEnv* env = nullptr;
+    dvoid* err = nullptr;
+    dvoid* stmt = nullptr;
+    dvoid* descriptor = nullptr;
+    OCISvcCtx* svc = nullptr;
+    OCIEnvCreate(&env, OCI_DEFAULT, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 0,
+                 nullptr);
+    OCIHandleAlloc(env, &err, OCI_HTYPE_ERROR, 0, nullptr);
+    OCILogon(env, static_cast<OCIError*>(err), &svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8);
+    OCIHandleAlloc(env, &stmt, OCI_HTYPE_STMT, 0, nullptr);
+    OCIDescriptorAlloc(env, &descriptor, OCI_DTYPE_TIMESTAMP, 0, nullptr);
+    OCIStmtPrepare(static_cast<OCIStmt*>(stmt), static_cast<OCIError*>(err), World::Text("select 1 from dual"), 18,
+                   OCI_NTV_SYNTAX, OCI_DEFAULT);
+    OCIStmtExecute(svc, static_cast<OCIStmt*>(stmt), static_cast<OCIError*>(err), 0, 0, nullptr, nullptr, OCI_DEFAULT);
+    w.Surely("OCIDescriptorFree", [&] { return OCIDescriptorFree(descriptor, OCI_DTYPE_TIMESTAMP); });
+    w.Surely("OCIHandleFree of a statement", [&] { return OCIHandleFree(stmt, OCI_HTYPE_STMT); });
+    w.Surely("OCILogoff", [&] { return OCILogoff(svc, static_cast<OCIError*>(err)); });
+    w.Surely("OCIHandleFree of the environment", [&] { return OCIHandleFree(env, OCI_HTYPE_ENV); });
+    w.See("freed");
+}
+
+void HandlesAndDescriptors(World& w) {
+    for (ub4 type = OCI_HTYPE_ERROR; type <= 29; ++type) {
+        if (type == OCI_HTYPE_BIND || type == OCI_HTYPE_DEFINE) continue;
+        w.New<dvoid>(type);
+    }
+    for (const ub4 type : {OCI_DTYPE_LOB, OCI_DTYPE_ROWID, OCI_DTYPE_RSET, OCI_DTYPE_TIMESTAMP_TZ}) {
+        w.NewDescriptor<dvoid>(type);
+    }
+    static dvoid* array[5];
+    w.Step("OCIArrayDescriptorAlloc", [&] {
+        return OCIArrayDescriptorAlloc(w.env, array, OCI_DTYPE_DATE, 5, 8, nullptr);
+    }, Told::environment);
+    w.AtEnd([] { return OCIArrayDescriptorFree(array, OCI_DTYPE_DATE); });
+    w.See("made");
+}
+
+// A server, a session and a context put together by hand, in UTF-16.
+void AttachAndBegin(World& w) {
+    auto* server = w.New<OCIServer>(OCI_HTYPE_SERVER);
+    auto* session = w.New<OCISession>(OCI_HTYPE_SESSION);
+    auto* svc = w.New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+    w.Step("OCIServerAttach", [&] {
+        const auto* name = reinterpret_cast<const OraText*>(u":memory:");
+        return OCIServerAttach(server, w.err, name, 16, OCI_DEFAULT);
+    });
+    w.AtEnd([&w, server] { return OCIServerDetach(server, w.err, OCI_DEFAULT); });
+    const struct { dvoid* on; ub4 type; dvoid* value; ub4 size; ub4 attribute; } set[] = {
+        {svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER},
+        {session, OCI_HTYPE_SESSION, const_cast<char16_t*>(u"a name of eighteen"), 36, OCI_ATTR_USERNAME},
+        {session, OCI_HTYPE_SESSION, const_cast<char16_t*>(u"password of eightn"), 36, OCI_ATTR_PASSWORD},
+        {svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION},
+    };
+    for (const auto& s : set) {
+        w.Step("OCIAttrSet", [&] { return OCIAttrSet(s.on, s.type, s.value, s.size, s.attribute, w.err); });
+    }
+    w.Step("OCISessionBegin", [&] { return OCISessionBegin(svc, w.err, session, OCI_CRED_EXT, OCI_DEFAULT); });
+    w.AtEnd([&w, svc, session] { return OCISessionEnd(svc, w.err, session, OCI_DEFAULT); });
+    OraText* name = nullptr;
+    ub4 length = 0;
+    w.Step("OCIAttrGet", [&] { return OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &length, OCI_ATTR_USERNAME, w.err); });
+    w.See(length);
+    w.Step("OCIPing", [&] { return OCIPing(svc, w.err, OCI_DEFAULT); });
+    OraText version[200];
+    w.Step("OCIServerVersion", [&] { return OCIServerVersion(svc, w.err, version, sizeof version, OCI_HTYPE_SVCCTX); });
+    w.See(version[0] != 0 ? "version" : "");
+}
+
+// The owner's account is made before, so that a failed logon or change is seen by the next.
+void Account(World& w) {
+    static std::string database;
+    database = w.Folder() + "/accounts.db";
+    OCISvcCtx* svc = nullptr;
+    EXPECT_EQ(OCILogon(w.env, w.err, &svc, World::Text("ann"), 3, World::Text("one"), 3, World::Text(database),
+                       World::Size(database)), OCI_SUCCESS);
+    EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS);
+}
+
+void PasswordChange(World& w) {
+    const std::string database = w.Folder() + "/accounts.db";
+    const auto change = [&w](const char* from, const char* to) {
+        return OCIPasswordChange(w.svc, w.err, World::Text("ann"), 3, World::Text(from), 3, World::Text(to), 3,
+                                 OCI_DEFAULT);
+    };
+    LogOn(w, "ann", "one", database);
+    try {
+        w.Step("OCIPasswordChange", [&] { return change("one", "two"); });
+    } catch (const Stopped&) {
+        EXPECT_EQ(change("one", "one"), OCI_SUCCESS) << "it is still the old one";
+        throw;
+    }
+    EXPECT_EQ(change("two", "one"), OCI_SUCCESS) << "it is the new one";
+    w.See("changed");
+}
+
+// The first logon by name makes the database and its owner's account: both, or neither.
+void FirstLogon(World& w) {
+    const std::string database = w.Folder() + "/new.db";
+    w.AtEnd([database] {
+        std::filesystem::remove(database);
+        return OCI_SUCCESS;
+    });
+    LogOn(w, "ann", "one", database);
+    OCISvcCtx* other = nullptr;
+    EXPECT_EQ(OCILogon(w.env, w.err, &other, World::Text("ann"), 3, World::Text("two"), 3, World::Text(database),
+                       World::Size(database)), OCI_ERROR);
+    w.See(w.Number(w.err, OCI_HTYPE_ERROR));
+}
+
+// What is told of an error takes memory, too; without it there is the return code, and the record stays.
+void ErrorTexts(World& w) {
+    OCIStmtPrepare(w.stmt, w.err, World::Text("select * from missing"), 21, OCI_NTV_SYNTAX, OCI_DEFAULT);
+    OCIStmtExecute(w.svc, w.stmt, w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT);
+    OraText words[1024] = "";
+    sb4 number = 0;
+    const auto get = [&] {
+        return OCIErrorGet(w.err, 1, nullptr, &number, words, sizeof words, OCI_HTYPE_ERROR);
+    };
+    sword code = OCI_SUCCESS;
+    {
+        const Armed armed;
+        code = get();
+    }
+    if (code != OCI_SUCCESS) {
+        EXPECT_EQ(get(), OCI_SUCCESS) << "asked again";
+    }
+    w.See(number);
+    w.See(std::strstr(reinterpret_cast<const char*>(words), "missing") ? "named" : "not named");
+}
+
+constexpr Scenario kScenarios[] = {
+    {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;"},
+    {"FreeingTakesNoMemory", Ground::nothing, nullptr, FreeingTakesNoMemory, "freed;"},
+    {"HandlesAndDescriptors", Ground::environment, nullptr, HandlesAndDescriptors, "made;"},
+    {"AttachAndBegin", Ground::environment, nullptr, AttachAndBegin, "36;version;", OCI_UTF16},
+    {"FirstLogon", Ground::environment, nullptr, FirstLogon, "1017;"},
+    {"PasswordChange", Ground::environment, Account, PasswordChange, "changed;"},
+    {"ErrorTexts", Ground::session, nullptr, ErrorTexts, "942;named;"},
+};
+
+}  // namespace
+
+std::span<const Scenario> HandleScenarios() { return kScenarios; }
+
+}  // namespace faults

@@ -1,0 +1,295 @@
+// Numbers, dates, strings and raws, files, threads.
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+
+#include "faults/scenarios.h"
+
+namespace faults {
+namespace {
+
+// ---- Numbers
+
+OCINumber Number(World& w, std::string_view text) {
+    OCINumber number{};
+    const std::string format(text.size(), '9');
+    w.Step("OCINumberFromText", [&] {
+        return OCINumberFromText(w.err, World::Text(text), World::Size(text), World::Text(format), World::Size(format),
+                                 nullptr, 0, &number);
+    });
+    return number;
+}
+
+void SeeNumber(World& w, const OCINumber& number) {
+    OraText text[60] = "";
+    ub4 size = sizeof text;
+    w.Step("OCINumberToText", [&] {
+        return OCINumberToText(w.err, &number, World::Text("S99.999999EEEE"), 14, nullptr, 0, &size, text);
+    });
+    w.See({reinterpret_cast<char*>(text), size});
+}
+
+void NumberArithmetic(World& w) {
+    const OCINumber one = Number(w, "12345678901234567890.5"), other = Number(w, "987654321.25");
+    using Function = sword (*)(OCIError*, const OCINumber*, const OCINumber*, OCINumber*);
+    for (const Function function : {OCINumberAdd, OCINumberSub, OCINumberMul, OCINumberDiv, OCINumberMod}) {
+        OCINumber result{};
+        w.Step("a number function", [&] { return function(w.err, &one, &other, &result); });
+        SeeNumber(w, result);
+    }
+}
+
+void NumberFunctions(World& w) {
+    const OCINumber half = Number(w, "0.5"), large = Number(w, "123.456"), exponent = Number(w, "7.25");
+    using Unary = sword (*)(OCIError*, const OCINumber*, OCINumber*);
+    for (const Unary function : {OCINumberArcCos, OCINumberArcSin, OCINumberArcTan, OCINumberCos, OCINumberExp,
+                                 OCINumberHypCos, OCINumberHypSin, OCINumberHypTan, OCINumberLn, OCINumberSin,
+                                 OCINumberSqrt, OCINumberTan}) {
+        OCINumber result{};
+        w.Step("a number function", [&] { return function(w.err, &half, &result); });
+        SeeNumber(w, result);
+    }
+    using Binary = sword (*)(OCIError*, const OCINumber*, const OCINumber*, OCINumber*);
+    for (const Binary function : {OCINumberPower, OCINumberLog, OCINumberArcTan2}) {
+        OCINumber result{};
+        w.Step("a number function", [&] { return function(w.err, &large, &exponent, &result); });
+        SeeNumber(w, result);
+    }
+    OCINumber result{};
+    w.Step("OCINumberIntPower", [&] { return OCINumberIntPower(w.err, &large, 17, &result); });
+    SeeNumber(w, result);
+}
+
+void NumberForms(World& w) {
+    const double real = 1234.0625;
+    OCINumber number{};
+    w.Step("OCINumberFromReal", [&] { return OCINumberFromReal(w.err, &real, sizeof real, &number); });
+    long double back = 0;
+    w.Step("OCINumberToReal", [&] { return OCINumberToReal(w.err, &number, sizeof back, &back); });
+    w.See(static_cast<long>(back * 10000));
+    for (const std::string_view format : {"L9G999D99", "TM9", "RN", "9.9EEEE", "FM0000V99", "XXXXXX"}) {
+        OraText text[80] = "";
+        ub4 size = sizeof text;
+        constexpr std::string_view kSettings = "NLS_NUMERIC_CHARACTERS=',.' NLS_CURRENCY='EUR'";
+        w.Step("OCINumberToText", [&] {
+            return OCINumberToText(w.err, &number, World::Text(format), World::Size(format), World::Text(kSettings),
+                                   World::Size(kSettings), &size, text);
+        });
+        w.See({reinterpret_cast<char*>(text), size});
+    }
+}
+
+// ---- Dates
+
+void Dates(World& w) {
+    OCIDate date{};
+    w.Step("OCIDateFromText", [&] {
+        return OCIDateFromText(w.err, World::Text("Friday 29 FEBRUARY 2008 11:12:13"), 32,
+                               World::Text("DAY DD MONTH YYYY HH24:MI:SS"), 28, nullptr, 0, &date);
+    });
+    w.Step("OCIDateNextDay", [&] { return OCIDateNextDay(w.err, &date, World::Text("MONDAY"), 6, &date); });
+    w.Step("OCIDateAddMonths", [&] { return OCIDateAddMonths(w.err, &date, 11, &date); });
+    OCIDate now{};
+    w.Step("OCIDateSysDate", [&] { return OCIDateSysDate(w.err, &now); });
+    EXPECT_GT(now.OCIDateYYYY, 2000);
+    OraText text[200] = "";
+    ub4 size = sizeof text;
+    constexpr std::string_view kFormat = "FMDay, DDTH \"of the month of\" Month YYYY, JSP, HH:MI:SS AM";
+    w.Step("OCIDateToText", [&] {
+        return OCIDateToText(w.err, &date, World::Text(kFormat), static_cast<ub1>(kFormat.size()),
+                             World::Text("FRENCH"), 6, &size, text);
+    });
+    w.See({reinterpret_cast<char*>(text), size});
+}
+
+// A region that no other scenario reads: it is read once for the process, and the second run finds it.
+void Datetimes(World& w) {
+    auto* there = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
+    auto* here = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
+    static const char* const zones[] = {"Asia/Kolkata",     "Europe/Paris",    "America/New_York", "Africa/Cairo",
+                                        "Pacific/Auckland", "America/Chicago", "Asia/Tokyo",       "Europe/London"};
+    static std::size_t next = 0;
+    const std::string_view zone = zones[next++ % std::size(zones)];
+    const auto construct = [&](OCIDateTime* value, std::string_view name) {
+        return OCIDateTimeConstruct(w.env, w.err, value, 2024, 7, 15, 13, 14, 15, 5, World::Text(name), name.size());
+    };
+    w.Step("OCIDateTimeConstruct", [&] { return construct(there, zone); });
+    w.Step("OCIDateTimeConstruct", [&] { return construct(here, "-12:00"); });
+    sword order = 0;
+    w.Step("OCIDateTimeCompare", [&] { return OCIDateTimeCompare(w.env, w.err, there, here, &order); });
+    w.See(order);
+    w.Step("OCIDateTimeConstruct", [&] { return construct(here, ""); });
+    w.Step("OCIDateTimeAssign", [&] { return OCIDateTimeAssign(w.env, w.err, there, here); });
+    ub1 hour = 0, minute = 0, second = 0;
+    ub4 fraction = 0;
+    w.Step("OCIDateTimeGetTime", [&] {
+        return OCIDateTimeGetTime(w.env, w.err, here, &hour, &minute, &second, &fraction);
+    });
+    w.See(hour);
+}
+
+// ---- Strings and raws
+
+void Strings(World& w) {
+    static OCIString *string, *copy;
+    string = copy = nullptr;
+    w.AtEnd([&w] {
+        const sword code = copy ? OCIStringResize(w.env, w.err, 0, &copy) : OCI_SUCCESS;
+        return string ? OCIStringResize(w.env, w.err, 0, &string) : code;
+    });
+    const auto contents = [&](OCIString* one) {
+        return std::string_view(reinterpret_cast<char*>(OCIStringPtr(w.env, one)), OCIStringSize(w.env, one));
+    };
+    const auto assign = [&](std::string_view text) {
+        return OCIStringAssignText(w.env, w.err, World::Text(text), World::Size(text), &string);
+    };
+    w.Step("OCIStringAssignText", [&] { return assign("hello"); });
+    try {
+        w.Step("OCIStringAssignText", [&] { return assign("a text that is too long for the room of the first"); });
+        w.Step("OCIStringResize", [&] { return OCIStringResize(w.env, w.err, 1000, &string); });
+    } catch (const Stopped&) {
+        EXPECT_TRUE(contents(string) == "hello" || contents(string).size() == 49) << contents(string);
+        throw;
+    }
+    w.Step("OCIStringAssign", [&] { return OCIStringAssign(w.env, w.err, string, &copy); });
+    w.See(contents(copy));
+}
+
+void Raws(World& w) {
+    static OCIRaw *raw, *copy;
+    raw = copy = nullptr;
+    w.AtEnd([&w] {
+        const sword code = copy ? OCIRawResize(w.env, w.err, 0, &copy) : OCI_SUCCESS;
+        return raw ? OCIRawResize(w.env, w.err, 0, &raw) : code;
+    });
+    const ub1 bytes[100] = {1, 2, 3};
+    w.Step("OCIRawAssignBytes", [&] { return OCIRawAssignBytes(w.env, w.err, bytes, 3, &raw); });
+    try {
+        w.Step("OCIRawAssignBytes", [&] { return OCIRawAssignBytes(w.env, w.err, bytes, 100, &raw); });
+        w.Step("OCIRawResize", [&] { return OCIRawResize(w.env, w.err, 2000, &raw); });
+    } catch (const Stopped&) {
+        EXPECT_EQ(OCIRawPtr(w.env, raw)[2], 3);
+        throw;
+    }
+    w.Step("OCIRawAssignRaw", [&] { return OCIRawAssignRaw(w.env, w.err, raw, &copy); });
+    w.See(OCIRawSize(w.env, copy));
+}
+
+// ---- Files and threads
+
+void Files(World& w) {
+    const std::string folder = w.Folder();
+    w.Step("OCIFileInit", [&] { return OCIFileInit(w.env, w.err); });
+    w.AtEnd([&w] { return OCIFileTerm(w.env, w.err); });
+    const std::string path = folder + "/a file with a long name";
+    std::ofstream(path) << "what was there";
+    OCIFileObject* file = nullptr;
+    const auto open = [&](ub4 create) {
+        w.Step("OCIFileOpen", [&] {
+            return OCIFileOpen(w.env, w.err, &file, World::Text("a file with a long name"), World::Text(folder),
+                               OCI_FILE_READ_WRITE, create, OCI_FILE_BIN);
+        });
+        w.AtEnd([&w, file] { return OCIFileClose(w.env, w.err, file); });
+    };
+    try {
+        open(OCI_FILE_TRUNCATE);
+    } catch (const Stopped&) {
+        EXPECT_EQ(std::filesystem::file_size(path), 14u) << "emptied, though not opened";
+        throw;
+    }
+    std::filesystem::remove(path);
+    try {
+        open(OCI_FILE_EXCL);
+    } catch (const Stopped&) {
+        EXPECT_FALSE(std::filesystem::exists(path)) << "made, though not opened";
+        throw;
+    }
+    static char data[20000];
+    std::memset(data, 'x', sizeof data);
+    ub4 count = 0;
+    w.Step("OCIFileWrite", [&] { return OCIFileWrite(w.env, w.err, file, data, sizeof data, &count); });
+    w.See(count);
+    w.Step("OCIFileFlush", [&] { return OCIFileFlush(w.env, w.err, file); });
+    w.Step("OCIFileSeek", [&] {
+        return OCIFileSeek(w.env, w.err, file, OCI_FILE_SEEK_BEGINNING, 19990, OCI_FILE_FORWARD);
+    });
+    w.Step("OCIFileRead", [&] { return OCIFileRead(w.env, w.err, file, data, sizeof data, &count); });
+    w.See(count);
+    ubig_ora length = 0;
+    ub1 there = 0;
+    w.Step("OCIFileGetLength", [&] {
+        return OCIFileGetLength(w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &length);
+    });
+    w.Step("OCIFileExists", [&] {
+        return OCIFileExists(w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &there);
+    });
+    w.See(static_cast<long>(length) + there);
+}
+
+void Threads(World& w) {
+    static OCIThreadMutex* mutex;
+    static OCIThreadKey* key;
+    static OCIThreadId* id;
+    static OCIThreadHandle* handle;
+    w.Surely("OCIThreadProcessInit", [] {
+        OCIThreadProcessInit();
+        return OCI_SUCCESS;
+    });
+    w.Step("OCIThreadInit", [&] { return OCIThreadInit(w.env, w.err); });
+    w.AtEnd([&w] { return OCIThreadTerm(w.env, w.err); });
+    w.Step("OCIThreadMutexInit", [&] { return OCIThreadMutexInit(w.env, w.err, &mutex); });
+    w.AtEnd([&w] { return OCIThreadMutexDestroy(w.env, w.err, &mutex); });
+    w.Step("OCIThreadMutexAcquire", [&] { return OCIThreadMutexAcquire(w.env, w.err, mutex); });
+    w.Surely("OCIThreadMutexRelease", [&] { return OCIThreadMutexRelease(w.env, w.err, mutex); });
+    w.Step("OCIThreadKeyInit", [&] { return OCIThreadKeyInit(w.env, w.err, &key, nullptr); });
+    w.AtEnd([&w] { return OCIThreadKeyDestroy(w.env, w.err, &key); });
+    w.Step("OCIThreadKeySet", [&] { return OCIThreadKeySet(w.env, w.err, key, &w); });
+    dvoid* value = nullptr;
+    w.Step("OCIThreadKeyGet", [&] { return OCIThreadKeyGet(w.env, w.err, key, &value); });
+    w.See(value == &w);
+    w.Step("OCIThreadIdInit", [&] { return OCIThreadIdInit(w.env, w.err, &id); });
+    w.AtEnd([&w] { return OCIThreadIdDestroy(w.env, w.err, &id); });
+    w.Step("OCIThreadHndInit", [&] { return OCIThreadHndInit(w.env, w.err, &handle); });
+    w.AtEnd([&w] { return OCIThreadHndDestroy(w.env, w.err, &handle); });
+    static int ran;
+    ran = 0;
+    // The system does not say whether it was memory or the number of threads: 21500 for both.
+    w.Step("OCIThreadCreate", [&] {
+        return OCIThreadCreate(w.env, w.err, [](dvoid* count) { ++*static_cast<int*>(count); }, &ran, id, handle);
+    }, Told::error_handle, 21500);
+    try {
+        w.Step("OCIThreadJoin", [&] { return OCIThreadJoin(w.env, w.err, handle); });
+    } catch (const Stopped&) {
+        EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_SUCCESS) << "asked again";
+        EXPECT_EQ(OCIThreadClose(w.env, w.err, handle), OCI_SUCCESS);
+        throw;
+    }
+    w.Surely("OCIThreadClose", [&] { return OCIThreadClose(w.env, w.err, handle); });
+    w.See(ran);
+}
+
+constexpr Scenario kScenarios[] = {
+    {"NumberArithmetic", Ground::environment, nullptr, NumberArithmetic,
+     "+1.234568E+19;+1.234568E+19;+1.219326E+28;+1.250000E+10;+1.774692E+08;"},
+    {"NumberFunctions", Ground::environment, nullptr, NumberFunctions,
+     "+1.047198E+00;+5.235988E-01;+4.636476E-01;+8.775826E-01;+1.648721E+00;+1.127626E+00;+5.210953E-01;"
+     "+4.621172E-01;-6.931472E-01;+4.794255E-01;+7.071068E-01;+5.463025E-01;+1.457013E+15;+4.113474E-01;"
+     "+1.512138E+00;+3.595071E+35;"},
+    {"NumberForms", Ground::environment, nullptr, NumberForms,
+     "12340625; EUR1.234,06;1234,0625;       MCCXXXIV; 1.2E+03;123406;    4D2;"},
+    {"Dates", Ground::environment, nullptr, Dates,
+     "Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED SIXTY-SIX, "
+     "11:12:13 AM;"},
+    {"Datetimes", Ground::environment, nullptr, Datetimes, "-1;13;"},
+    {"Strings", Ground::environment, nullptr, Strings, "a text that is too long for the room of the first;"},
+    {"Raws", Ground::environment, nullptr, Raws, "100;"},
+    {"Files", Ground::environment, nullptr, Files, "20000;10;20001;"},
+    {"Threads", Ground::environment, nullptr, Threads, "1;1;"},
+};
+
+}  // namespace
+
+std::span<const Scenario> PackageScenarios() { return kScenarios; }
+
+}  // namespace faults

@@ -1,0 +1,24 @@
+// The scenarios, one list a subject.
+#pragma once
+
+#include <span>
+#include <vector>
+
+#include "faults/world.h"
+
+namespace faults {
+
+std::span<const Scenario> HandleScenarios();
+std::span<const Scenario> StatementScenarios();
+std::span<const Scenario> FetchScenarios();
+std::span<const Scenario> PackageScenarios();
+
+inline std::vector<Scenario> AllScenarios() {
+    std::vector<Scenario> all;
+    for (const auto& list : {HandleScenarios(), StatementScenarios(), FetchScenarios(), PackageScenarios()}) {
+        all.insert(all.end(), list.begin(), list.end());
+    }
+    return all;
+}
+
+}  // namespace faults

@@ -1,0 +1,404 @@
+// Changes, transactions, definitions, blocks, the statement cache, and what is told of statements.
+#include "faults/scenarios.h"
+
+namespace faults {
+namespace {
+
+void Table(World& w) {
+    w.Sql("create table t(a number primary key, b varchar2(100), d date, c char(8))");
+    w.Sql("create table empty(a number, b varchar2(100))");
+}
+
+// A row of the same transaction that no failure may take away.
+void EarlierRow(World& w) {
+    w.Sql("insert into t(a, b) values(0, 'earlier')");
+    w.Keeps("select count(*) from t", "1");
+}
+
+std::string Rows(World& w) { return w.One("select group_concat(a || coalesce(b, '-')) from (select * from t order by a)"); }
+
+ub4 QuietAttribute(World& w, ub4 attribute) {
+    ub4 value = 99;
+    EXPECT_EQ(OCIAttrGet(w.stmt, OCI_HTYPE_STMT, &value, nullptr, attribute, w.err), OCI_SUCCESS);
+    return value;
+}
+
+// An array that fails on its way keeps the rows before, and says how many they are.
+void ExecuteArray(World& w, ub4 count, ub4 mode = OCI_DEFAULT) {
+    try {
+        w.Execute(count, mode);
+    } catch (const Stopped&) {
+        w.Keeps("select count(*) from t", std::to_string(1 + QuietAttribute(w, OCI_ATTR_ROW_COUNT)));
+        throw;
+    }
+    w.Keeps("select count(*) from t", std::to_string(1 + count));
+}
+
+// Whether one of the rows of a batch failed for want of memory.
+bool RowWithoutMemory(World& w, ub4 errors) {
+    bool any = false;
+    dvoid* other = nullptr;
+    OCIHandleAlloc(w.env, &other, OCI_HTYPE_ERROR, 0, nullptr);
+    for (ub4 index = 0; index < errors; ++index) {
+        dvoid* row = nullptr;
+        EXPECT_EQ(OCIParamGet(w.err, OCI_HTYPE_ERROR, static_cast<OCIError*>(other), &row, index), OCI_SUCCESS);
+        any = any || World::Number(row, OCI_HTYPE_ERROR) == 1019;
+    }
+    OCIHandleFree(other, OCI_HTYPE_ERROR);
+    return any;
+}
+
+struct Numbers {
+    sb4 numbers[5] = {10, 20, 30, 40, 50};
+    char texts[5][60] = {"aa", "a text too long for a short string", "cc", "", "ee"};
+    sb2 indicators[5] = {0, 0, -1, 0, 0};
+    void Bind(World& w) {
+        w.Bind(1, {numbers, 4, SQLT_INT});
+        w.Bind(2, {texts, 60, SQLT_STR, indicators});
+    }
+};
+
+void ArrayInsert(World& w) {
+    EarlierRow(w);
+    Numbers rows;
+    w.Prepare("insert into t(a, b) values(:1, :2)");
+    rows.Bind(w);
+    ExecuteArray(w, 5);
+    w.See(w.Attribute<ub4>(OCI_ATTR_ROW_COUNT));
+    w.See(Rows(w));
+}
+
+// Rows 1 and 3 are refused: each gets a record of its own. So does one that finds no memory; where none is left for
+// records, the call fails. Every row is accounted for.
+void BatchErrors(World& w) {
+    EarlierRow(w);
+    Numbers rows;
+    rows.numbers[1] = rows.numbers[3] = 10;
+    w.Prepare("insert into t(a, b) values(:1, :2)");
+    rows.Bind(w);
+    ExecuteArray(w, 5, OCI_BATCH_ERRORS);
+    const ub4 errors = QuietAttribute(w, OCI_ATTR_NUM_DML_ERRORS), done = QuietAttribute(w, OCI_ATTR_ROW_COUNT);
+    EXPECT_EQ(errors + done, 5u) << "without " << Seen().first;
+    w.Keeps("select count(*) from t", std::to_string(1 + done));
+    if (Seen().failed && RowWithoutMemory(w, errors)) throw Stopped();
+    w.See(w.Attribute<ub4>(OCI_ATTR_NUM_DML_ERRORS));
+    for (ub4 index = 0; index < 2; ++index) {
+        auto* const other = w.New<OCIError>(OCI_HTYPE_ERROR);
+        OCIError* const err = w.err;
+        dvoid* row = nullptr;
+        w.err = other;
+        try {
+            w.Step("OCIParamGet", [&] { return OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, index); });
+        } catch (const Stopped&) {
+            w.err = err;
+            throw;
+        }
+        w.err = err;
+        w.See(w.Number(row, OCI_HTYPE_ERROR));
+        w.See(w.Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, row, OCI_HTYPE_ERROR));
+    }
+    w.See(Rows(w));
+}
+
+void Returning(World& w) {
+    EarlierRow(w);
+    Numbers rows;
+    char texts[5][60] = {};
+    sb2 indicators[5] = {};
+    w.Prepare("insert into t(a, b) values(:a, 'n' || :b) returning b into :out");
+    w.BindName("a", {rows.numbers, 4, SQLT_INT});
+    w.BindName("b", {rows.texts, 60, SQLT_STR, rows.indicators});
+    w.BindName("out", {texts, 60, SQLT_STR, indicators});
+    ExecuteArray(w, 3);
+    for (const auto& text : {texts[0], texts[1], texts[2]}) w.See(text);
+    w.See(Rows(w));
+}
+
+// Dates, fixed texts and functions of the dialect, in values and in conditions.
+void FunctionsAndComparisons(World& w) {
+    EarlierRow(w);
+    char day[] = "29-FEB-24";
+    sb4 changed = 0;
+    w.Prepare("insert into t(a, b, d, c) values(1, initcap('ann') || to_char(to_date('2024-03-01', 'YYYY-MM-DD'), "
+              "'DD MONTH YYYY'), :1, 'ab')");
+    w.Bind(1, {day, sizeof day, SQLT_STR});
+    w.Execute();
+    w.Keeps("select count(*) from t", "2");
+    w.Prepare("update t set b = b || lpad(to_char(1234.5, '9,999.99'), 12, '*') where d = '29-FEB-24' and c = 'ab'");
+    w.Execute();
+    changed = static_cast<sb4>(w.Attribute<ub4>(OCI_ATTR_ROW_COUNT));
+    w.See(changed);
+    w.See(Rows(w));
+}
+
+// Several rows changed, and given back, by one statement; then one from another table.
+void ChangesOfManyRows(World& w) {
+    w.Sql("insert into t(a, b) values(0, 'earlier')");
+    w.Sql("insert into t(a, b) values(1, 'also earlier')");
+    w.Keeps("select count(*) || max(b) from t", "2earlier", "");
+    char texts[2][60] = {};
+    ub4 count = 0;
+    w.Prepare("begin update t set b = 'a longer text for ' || b returning b into :out; end;");
+    w.BindName("out", {texts, 60, SQLT_STR}, 2, &count);
+    w.Execute();
+    w.Keeps("select count(*) || max(b) from t", "2a longer text for earlier", "");
+    w.See(count);
+    w.See(texts[1]);
+    w.Run("insert into t(a, b) select a + 10, b from t");
+    w.Keeps("select count(*) || max(b) from t", "4a longer text for earlier", "");
+    w.Run("delete from t where a > 0");
+    w.Keeps("select count(*) || max(b) from t", "1a longer text for earlier", "");
+    w.See(Rows(w));
+}
+
+void CommitsOnSuccess(World& w) {
+    EarlierRow(w);
+    w.AtEnd([&w] {
+        w.Sql("delete from t");
+        w.Sql("commit");
+        return OCI_SUCCESS;
+    });
+    w.Prepare("insert into t(a, b) values(1, 'done')");
+    ExecuteArray(w, 1, OCI_COMMIT_ON_SUCCESS);
+    w.Sql("rollback");
+    w.See(Rows(w));
+}
+
+void Transactions(World& w) {
+    EarlierRow(w);
+    w.Run("savepoint s");
+    w.Run("insert into t(a) values(1)");
+    w.Keeps("select count(*) from t", "2");
+    w.Run("rollback to s");
+    w.Keeps("select count(*) from t", "1");
+    w.Run("commit");
+    w.Keeps("select count(*) from t", "1", "1");
+    w.AtEnd([&w] {
+        w.Sql("delete from t");
+        w.Sql("commit");
+        return OCI_SUCCESS;
+    });
+    w.Sql("rollback");
+    w.See(w.One("select count(*) from t"));
+    w.Run("delete from t");
+    w.Keeps("select count(*) from t", "0", "1");
+    w.Run("rollback");
+    w.Keeps("select count(*) from t", "1", "1");
+    w.See(w.One("select count(*) from t"));
+}
+
+// A definition commits what came before it, when it is done.
+void Definition(World& w) {
+    EarlierRow(w);
+    w.AtEnd([&w] {
+        w.Sql("drop table if exists made");
+        w.Sql("delete from t");
+        w.Sql("commit");
+        return OCI_SUCCESS;
+    });
+    w.Prepare("create table made(n number(5,2), d date default sysdate, v varchar2(20) not null)");
+    w.Execute();
+    w.See(w.One("select count(*) from made"));
+    w.Sql("rollback");
+    w.See(w.One("select count(*) from t"));
+}
+
+void Block(World& w) {
+    EarlierRow(w);
+    sb4 numbers[3] = {1, 2, 3};
+    ub4 count = 3;
+    sb4 total = 0;
+    auto* result = w.NewDescriptor<OCIResult>(OCI_DTYPE_RSET);
+    w.Prepare("begin insert into t(a) values(:1); select sum(a) into :2 from t; open :3 for select a from t; end;");
+    w.Bind(1, {numbers, 4, SQLT_INT}, OCI_DEFAULT, 3, &count);
+    w.Bind(2, {&total, 4, SQLT_INT});
+    w.Bind(3, {&result, 8, SQLT_RSET});
+    w.Execute();
+    w.Keeps("select count(*) from t", "4");
+    w.See(total);
+    w.See(Rows(w));
+}
+
+void BlockWithCursor(World& w) {
+    sb4 x = 77;
+    static OCIStmt* cursor;
+    cursor = nullptr;
+    w.AtEnd([] { return cursor ? OCIHandleFree(cursor, OCI_HTYPE_STMT) : OCI_SUCCESS; });
+    w.Prepare("begin open :c for select 'a value that is not short at all', :x from dual; end;");
+    w.BindName("c", {&cursor, 8, SQLT_CUR});
+    w.BindName("x", {&x, 4, SQLT_INT});
+    w.Execute();
+    OCIStmt* const block = w.stmt;
+    w.stmt = cursor;
+    char text[40] = "";
+    sb4 number = 0;
+    try {
+        w.Define(1, {text, 40, SQLT_STR});
+        w.Define(2, {&number, 4, SQLT_INT});
+        w.Fetch();
+    } catch (const Stopped&) {
+        w.stmt = block;
+        throw;
+    }
+    w.stmt = block;
+    w.See(text);
+    w.See(number);
+}
+
+void IndexTables(World& w) {
+    sb4 numbers[5] = {1, 2, 3, 4, 5};
+    char texts[5][40] = {};
+    ub4 count = 5, texts_count = 0;
+    w.Prepare("begin :2 := 'number of the index table ' || :1; end;");
+    w.BindName("1", {numbers, 4, SQLT_INT}, 5, &count);
+    w.BindName("2", {texts, 40, SQLT_STR}, 5, &texts_count);
+    w.Execute();
+    w.See(texts_count);
+    w.See(texts[4]);
+}
+
+// The second statement of the block is refused: the first is undone, memory or not.
+void BlockThatUndoesItself(World& w) {
+    EarlierRow(w);
+    OCIStmtPrepare(w.stmt, w.err, World::Text("begin insert into t(a) values(1); insert into t(a) values(0); end;"), 66,
+                   OCI_NTV_SYNTAX, OCI_DEFAULT);
+    sword code;
+    {
+        const Armed armed;
+        code = OCIStmtExecute(w.svc, w.stmt, w.err, 1, 0, nullptr, nullptr, OCI_DEFAULT);
+    }
+    EXPECT_EQ(code, OCI_ERROR);
+    std::string text;
+    const sb4 number = World::Number(w.err, OCI_HTYPE_ERROR, &text);
+    if (Seen().failed) {
+        EXPECT_TRUE(number == 1 || number == 1019) << number << " without " << Seen().first;
+    } else {
+        EXPECT_EQ(number, 1);
+    }
+    if (text.find(World::kRolledBack) != std::string::npos) {
+        w.Keeps("select count(*) from t", "0");
+        throw Stopped();
+    }
+    w.See(Rows(w));
+}
+
+void PiecesIn(World& w) {
+    EarlierRow(w);
+    sb4 numbers[2] = {1, 2};
+    w.Prepare("insert into t(a, b) values(:1, :2)");
+    w.Bind(1, {numbers, 4, SQLT_INT});
+    w.Bind(2, {nullptr, 100, SQLT_CHR}, OCI_DATA_AT_EXEC);
+    const struct { const char* data; ub1 piece; } steps[] = {
+        {"first", OCI_FIRST_PIECE}, {" and a longer one to follow it", OCI_NEXT_PIECE}, {" and last", OCI_LAST_PIECE},
+        {"alone", OCI_ONE_PIECE}};
+    sword code = w.Execute(2);
+    for (const auto& step : steps) {
+        EXPECT_EQ(code, OCI_NEED_DATA);
+        dvoid* handle = nullptr;
+        ub4 type = 0, iteration = 0, index = 0;
+        ub1 direction = 0, piece = 0;
+        w.Step("OCIStmtGetPieceInfo", [&] {
+            return OCIStmtGetPieceInfo(w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
+        });
+        ub4 length = World::Size(step.data);
+        w.Step("OCIStmtSetPieceInfo", [&] {
+            return OCIStmtSetPieceInfo(handle, type, w.err, step.data, &length, step.piece, nullptr, nullptr);
+        });
+        code = w.Execute(2);
+    }
+    EXPECT_EQ(code, OCI_SUCCESS);
+    w.Keeps("select count(*) from t", "3");
+    w.See(Rows(w));
+}
+
+void StatementCache(World& w) {
+    ub4 size = 2;
+    w.Step("OCIAttrSet", [&] { return OCIAttrSet(w.svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, w.err); });
+    w.AtEnd([&w] {
+        ub4 none = 0;
+        return OCIAttrSet(w.svc, OCI_HTYPE_SVCCTX, &none, 0, OCI_ATTR_STMTCACHESIZE, w.err);
+    });
+    OCIStmt* const plain = w.stmt;
+    for (const std::string_view sql :
+         {"select 1 from dual", "select 2 from dual", "select 1 from dual", "select 3 from dual", "select 2 from dual"}) {
+        OCIStmt* statement = nullptr;
+        w.Step("OCIStmtPrepare2", [&] {
+            return OCIStmtPrepare2(w.svc, &statement, w.err, World::Text(sql), World::Size(sql), nullptr, 0,
+                                   OCI_NTV_SYNTAX, OCI_DEFAULT);
+        });
+        sb4 value = 0;
+        w.stmt = statement;
+        bool released = false;
+        try {
+            w.Define(1, {&value, 4, SQLT_INT});
+            w.Execute(1);
+            w.Step("OCIStmtRelease", [&] {
+                return OCIStmtRelease(statement, w.err, World::Text("a key that is not short at all"), 30, OCI_DEFAULT);
+            });
+            released = true;
+            w.See(value);
+        } catch (const Stopped&) {
+            w.stmt = plain;
+            if (!released) {
+                EXPECT_EQ(OCIStmtRelease(statement, w.err, nullptr, 0, OCI_DEFAULT), OCI_SUCCESS);
+            }
+            throw;
+        }
+        w.stmt = plain;
+    }
+}
+
+void DescribedColumns(World& w) {
+    w.Prepare("select a, b as \"a column with a long name\", d, a + 1 from t where a = :first or a = :second");
+    w.Execute(0, OCI_DESCRIBE_ONLY);
+    const ub4 count = w.Attribute<ub4>(OCI_ATTR_PARAM_COUNT);
+    for (ub4 position = 1; position <= count; ++position) {
+        dvoid* parameter = nullptr;
+        w.Step("OCIParamGet", [&] { return OCIParamGet(w.stmt, OCI_HTYPE_STMT, w.err, &parameter, position); });
+        w.AtEnd([parameter] { return OCIDescriptorFree(parameter, OCI_DTYPE_PARAM); });
+        OraText* name = nullptr;
+        ub4 length = 0;
+        w.Step("OCIAttrGet", [&] { return OCIAttrGet(parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, w.err); });
+        w.See({reinterpret_cast<char*>(name), length});
+        w.See(w.Attribute<ub2>(OCI_ATTR_DATA_TYPE, parameter, OCI_DTYPE_PARAM));
+    }
+    OraText *names[3], *indicators[3];
+    ub1 lengths[3], indicator_lengths[3], repeated[3];
+    OCIBind* binds[3];
+    sb4 found = 0;
+    w.Step("OCIStmtGetBindInfo", [&] {
+        return OCIStmtGetBindInfo(w.stmt, w.err, 3, 1, &found, names, lengths, indicators, indicator_lengths, repeated,
+                                  binds);
+    });
+    w.See(found);
+    w.See({reinterpret_cast<char*>(names[1]), lengths[1]});
+}
+
+constexpr Scenario kScenarios[] = {
+    {"ArrayInsert", Ground::session, Table, ArrayInsert,
+     "5;0earlier,10aa,20a text too long for a short string,30-,40-,50ee;"},
+    {"BatchErrors", Ground::session, Table, BatchErrors, "2;1;1;1;3;0earlier,10aa,30-,50ee;"},
+    {"Returning", Ground::session, Table, Returning,
+     "naa;na text too long for a short string;;0earlier,10naa,20na text too long for a short string,30-;"},
+    {"FunctionsAndComparisons", Ground::session, Table, FunctionsAndComparisons,
+     "1;0earlier,1Ann01 MARCH     2024*** 1,234.50;"},
+    {"Transactions", Ground::session, Table, Transactions, "1;1;"},
+    {"ChangesOfManyRows", Ground::session, Table, ChangesOfManyRows,
+     "2;a longer text for also earlier;0a longer text for earlier;"},
+    {"CommitsOnSuccess", Ground::session, Table, CommitsOnSuccess, "0earlier,1done;"},
+    {"Definition", Ground::session, Table, Definition, "0;1;"},
+    {"Block", Ground::session, Table, Block, "6;0earlier,1-,2-,3-;"},
+    {"BlockWithCursor", Ground::session, Table, BlockWithCursor, "a value that is not short at all;77;"},
+    {"IndexTables", Ground::session, Table, IndexTables, "5;number of the index table 5;"},
+    {"BlockThatUndoesItself", Ground::session, Table, BlockThatUndoesItself, "0earlier;"},
+    {"PiecesIn", Ground::session, Table, PiecesIn, "0earlier,1first and a longer one to follow it and last,2alone;"},
+    {"StatementCache", Ground::session, Table, StatementCache, "1;2;1;3;2;"},
+    {"DescribedColumns", Ground::session, Table, DescribedColumns,
+     "A;2;a column with a long name;1;D;12;A + 1;2;2;SECOND;"},
+};
+
+}  // namespace
+
+std::span<const Scenario> StatementScenarios() { return kScenarios; }
+
+}  // namespace faults

@@ -1,0 +1,176 @@
+// What a scenario works in: an environment, a session, a statement, as far as its row asks for them, and the steps it
+// takes. A step arms the allocations, makes one call of the library's, and ends the scenario if the call failed;
+// everything else here runs undisturbed.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "faults/allocations.h"
+#include "kelpci.h"
+#include "oci.h"
+
+namespace faults {
+
+// A step failed: the scenario is over.
+struct Stopped {};
+
+// Where a failing call says why: in an error handle's record, in the environment's, or in its return code alone.
+enum class Told { error_handle, environment, code };
+
+// What is there before a scenario begins.
+enum class Ground { nothing, environment, session };
+
+class World {
+public:
+    World(Ground ground, ub4 mode);
+    ~World();
+    World(const World&) = delete;
+    World& operator=(const World&) = delete;
+
+    // ---- Steps
+
+    // Any call; `name` is for messages. OCI_ERROR must be memory's fault and told so, by 1019 or `also`; then Stopped
+    // is thrown.
+    template <class Call>
+    sword Step(std::string_view name, Call call, Told told = Told::error_handle, sb4 also = 1019) {
+        const sword code = Disturbed(call);
+        if (code == OCI_ERROR) {
+            CheckFailure(name, told, also);
+            throw Stopped();
+        }
+        if (code == OCI_INVALID_HANDLE) ADD_FAILURE() << name << " answers OCI_INVALID_HANDLE";
+        return code;
+    }
+    // A call that needs no memory, such as one that frees: it never fails.
+    template <class Call>
+    void Surely(std::string_view name, Call call) {
+        const sword code = Disturbed(call);
+        EXPECT_EQ(code, OCI_SUCCESS) << name;
+    }
+    // A handle that lives until the scenario is over.
+    template <class T>
+    T* New(ub4 type) {
+        dvoid* handle = nullptr;
+        Step("OCIHandleAlloc", [&] { return OCIHandleAlloc(env, &handle, type, 16, nullptr); }, Told::environment);
+        AtEnd([handle, type] { return OCIHandleFree(handle, type); });
+        return static_cast<T*>(handle);
+    }
+    template <class T>
+    T* NewDescriptor(ub4 type) {
+        dvoid* descriptor = nullptr;
+        Step("OCIDescriptorAlloc", [&] { return OCIDescriptorAlloc(env, &descriptor, type, 16, nullptr); },
+             Told::environment);
+        AtEnd([descriptor, type] { return OCIDescriptorFree(descriptor, type); });
+        return static_cast<T*>(descriptor);
+    }
+
+    struct Area {
+        dvoid* value;
+        sb4 size;
+        ub2 type;
+        sb2* indicators = nullptr;
+        ub2* lengths = nullptr;
+        ub2* codes = nullptr;
+    };
+    void Prepare(std::string_view sql);
+    OCIBind* Bind(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT, ub4 most = 0, ub4* current = nullptr);
+    OCIBind* BindName(std::string_view name, const Area& area, ub4 most = 0, ub4* current = nullptr);
+    OCIDefine* Define(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT);
+    sword Execute(ub4 iterations = 1, ub4 mode = OCI_DEFAULT);
+    sword Fetch(ub4 rows = 1, ub2 orientation = OCI_FETCH_NEXT, sb4 offset = 0);
+    // Prepares and executes something that is no query.
+    void Run(std::string_view sql);
+    template <class T>
+    T Attribute(ub4 attribute, const dvoid* handle, ub4 type) {
+        T value{};
+        Step("OCIAttrGet", [&] { return OCIAttrGet(handle, type, &value, nullptr, attribute, err); });
+        return value;
+    }
+    template <class T>
+    T Attribute(ub4 attribute) {
+        return Attribute<T>(attribute, stmt, OCI_HTYPE_STMT);
+    }
+
+    // ---- Undisturbed
+
+    // What the scenario saw, piece by piece: "a;b;".
+    void See(std::string_view what) { seen.append(what).append(";"); }
+    void See(long value) { See(std::to_string(value)); }
+
+    void Sql(std::string_view sql);
+    // The first value of a query as text, "!" and the number for an error.
+    std::string One(std::string_view sql);
+    // What ends what a step began, undisturbed: called when the scenario is over, the last given first.
+    void AtEnd(std::function<sword()> end) { ends_.push_back(std::move(end)); }
+    // What must be in the database from now on, should a step fail; and what, if the record says that the transaction
+    // was rolled back.
+    void Keeps(std::string_view query, std::string_view value, std::string_view rolled_back = "0") {
+        kept_query_ = query;
+        kept_ = value;
+        kept_rolled_back_ = rolled_back;
+    }
+    void CheckKept();
+    // The number of a handle's first record, 0 without one, and its text.
+    static sb4 Number(dvoid* handle, ub4 type, std::string* text = nullptr);
+    // Ends what a scenario began, its transaction too.
+    void Reset();
+    // A folder of its own for files, gone with the world.
+    const std::string& Folder();
+
+    // What a record says where the transaction is lost.
+    static constexpr const char* kRolledBack = "the transaction was rolled back";
+    // How many worlds there have been in this process.
+    static int Made() { return made_; }
+
+    static OraText* Text(std::string_view text) {
+        return reinterpret_cast<OraText*>(const_cast<char*>(text.data()));
+    }
+    static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
+
+    OCIEnv* env = nullptr;
+    OCIError* err = nullptr;
+    OCISvcCtx* svc = nullptr;
+    OCIStmt* stmt = nullptr;
+    std::string seen;
+
+private:
+    template <class Call>
+    static sword Disturbed(Call call) {
+        const Armed armed;
+        return call();
+    }
+    void OpenEnvironment(ub4 mode);
+    void OpenSession();
+    void CheckFailure(std::string_view name, Told told, sb4 also);
+
+    static inline int made_ = 0;
+
+    std::string Encoded(std::string_view text) const;
+
+    Ground ground_;
+    bool utf16_;
+    OCIError* quiet_err_ = nullptr;
+    OCIStmt* quiet_ = nullptr;
+    std::vector<std::function<sword()>> ends_;
+    std::string folder_;
+    std::string kept_query_;
+    std::string kept_;
+    std::string kept_rolled_back_;
+    bool rolled_back_ = false;    // says the record of the step that failed
+};
+
+struct Scenario {
+    const char* name;
+    Ground ground;
+    void (*prepare)(World&);    // tables and the like, undisturbed; may be null
+    void (*run)(World&);        // its steps; what they show goes to `seen`
+    const char* expected;       // what a run without failure has seen
+    ub4 mode = OCI_DEFAULT;     // of the environment
+};
+
+}  // namespace faults
