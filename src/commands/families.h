@@ -10,12 +10,15 @@ void AddBufferCommands(HandlerTable& handlers);
 void AddConvenienceCommands(HandlerTable& handlers);
 void AddDateCommands(HandlerTable& handlers);
 void AddDateTimeCommands(HandlerTable& handlers);
+void AddDescribeCommands(HandlerTable& handlers);
 void AddDynamicCommands(HandlerTable& handlers);
 void AddEnvironmentCommands(HandlerTable& handlers);
 void AddErrorCommands(HandlerTable& handlers);
 void AddFetchAllCommand(HandlerTable& handlers);
 void AddFileCommands(HandlerTable& handlers);
 void AddHandleCommands(HandlerTable& handlers);
+void AddLobCommands(HandlerTable& handlers);
+void AddLobTransferCommands(HandlerTable& handlers);
 void AddNumberCommands(HandlerTable& handlers);
 void AddRowidCommands(HandlerTable& handlers);
 void AddSessionCommands(HandlerTable& handlers);
@@ -33,12 +36,15 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddConvenienceCommands,
     AddDateCommands,
     AddDateTimeCommands,
+    AddDescribeCommands,
     AddDynamicCommands,
     AddEnvironmentCommands,
     AddErrorCommands,
     AddFetchAllCommand,
     AddFileCommands,
     AddHandleCommands,
+    AddLobCommands,
+    AddLobTransferCommands,
     AddNumberCommands,
     AddRowidCommands,
     AddSessionCommands,

@@ -36,3 +36,7 @@ sword ShowDecimalFloat(Line& line, const ElementView& element);
 sword ShowSevenByteDate(Line& line, const ElementView& element);
 sword ShowDate(Line& line, const ElementView& element);
 sword ShowDateTime(Line& line, const ElementView& element);
+
+// --- lob_displays.cpp ------------------------------------------------------------------------------------------------
+
+sword ShowLob(Line& line, const ElementView& element);  // the beginning of the data behind the locator

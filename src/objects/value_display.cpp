@@ -18,11 +18,6 @@ sword ShowRowid(Line& line, const ElementView&) {
     return EndLine(line.Text("RID"));
 }
 
-// Locators are shown by the LOB commands only.
-sword ShowLocator(Line& line, const ElementView&) {
-    return EndLine(line);
-}
-
 using Show = sword (*)(Line& line, const ElementView& element);
 
 struct TypeDisplay {
@@ -54,8 +49,8 @@ constexpr TypeDisplay kTypeDisplays[] = {
     {SQLT_AVC, ShowPrefixedText<uint16_t>},
     {SQLT_CUR, ShowHandle},
     {SQLT_RDD, ShowRowid},
-    {SQLT_CLOB, ShowLocator},
-    {SQLT_BLOB, ShowLocator},
+    {SQLT_CLOB, ShowLob},
+    {SQLT_BLOB, ShowLob},
     {SQLT_RSET, ShowHandle},
     {SQLT_VST, ShowLibraryString},
     {SQLT_ODT, ShowDate},

@@ -314,8 +314,11 @@ void CallWrite(State& state, const std::vector<std::string>& words) {
     auto length = static_cast<ub4>(room.size());
     ub1 piece = 255;
     const sb4 rc = state.installed.write(state.installed.lob_context, room.data(), &length, &piece);
-    std::string line = "    probe: write callback = " + std::to_string(rc) + ": piece " + std::to_string(piece) + ", ";
-    AppendText(line, room.data(), std::min<long long>(length, static_cast<long long>(room.size())));
+    std::string line = "    probe: write callback = " + std::to_string(rc);
+    if (rc == OCI_CONTINUE) {
+        line += ": piece " + std::to_string(piece) + ", ";
+        AppendText(line, room.data(), std::min<long long>(length, static_cast<long long>(room.size())));
+    }
     Print(state, line + "\n");
 }
 

@@ -444,54 +444,67 @@ void SqliteQuery::Close() noexcept {
 
 // The row that SQLite stands on, as views. Throws where SQLite found no memory for a value.
 void SqliteQuery::Fill() {
-    sqlite3_stmt* statement = statement_.get();
-    for (std::size_t index = 0; index < values_.size(); ++index) {
-        Datum& value = values_[index];
-        sqlite3_value* stored = sqlite3_column_value(statement, static_cast<int>(index));
+    sqlite3_stmt* const statement = statement_.get();
+    const bool utf8 = connection_.Utf8();
+    const Reading* reading = readings_.data();
+    const int count = static_cast<int>(values_.size());
+    Datum* value = values_.data();
+    for (int index = 0; index < count; ++index, ++value, ++reading) {
+        sqlite3_value* const stored = sqlite3_column_value(statement, index);
         switch (sqlite3_value_type(stored)) {
             case SQLITE_INTEGER:
-                value.kind = Kind::integer;
-                value.length = 0;
-                value.integer = sqlite3_value_int64(stored);
-                if (readings_[index] != Reading::row_id) break;
-                rooms_[index].row = RowIdOf(value.integer);
-                SetView(value, Kind::row_id, &rooms_[index].row, sizeof(RowId));
+                value->kind = Kind::integer;
+                value->length = 0;
+                value->integer = sqlite3_value_int64(stored);
+                if (*reading == Reading::row_id) FillRowId(index, *value);
                 break;
             case SQLITE_FLOAT:
-                value.kind = Kind::real;
-                value.length = 0;
-                value.real = sqlite3_value_double(stored);
+                value->kind = Kind::real;
+                value->length = 0;
+                value->real = sqlite3_value_double(stored);
                 break;
-            case SQLITE_TEXT: FillText(index, stored, value); break;
-            case SQLITE_BLOB: FillBlob(index, stored, value); break;
-            default: value = {}; break;
+            case SQLITE_TEXT:
+                value->kind = Kind::text;
+                // The bytes as they lie in the file: asking for a text would copy them to add a zero.
+                value->data = utf8 ? sqlite3_value_blob(stored) : sqlite3_value_text(stored);
+                value->length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
+                if (!value->data && (value->length > 0 || !utf8)) throw std::bad_alloc();
+                if (*reading == Reading::date) FillDate(index, *value);
+                if (*reading == Reading::padded) Pad(index, *value);
+                break;
+            case SQLITE_BLOB:
+                value->kind = Kind::bytes;
+                value->data = sqlite3_value_blob(stored);
+                value->length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
+                if (!value->data && value->length > 0) throw std::bad_alloc();
+                if (*reading != Reading::bytes) FillNumber(index, *value);
+                break;
+            default: *value = {}; break;
         }
     }
 }
 
-// The bytes as they lie in the file: asking for a text would copy them to add a zero.
-void SqliteQuery::FillText(std::size_t column, sqlite3_value* stored, Datum& value) {
-    const void* data = connection_.Utf8() ? sqlite3_value_blob(stored) : sqlite3_value_text(stored);
-    SetView(value, Kind::text, data, static_cast<std::size_t>(sqlite3_value_bytes(stored)));
-    if (!data && (value.length > 0 || !connection_.Utf8())) throw std::bad_alloc();
-    if (readings_[column] == Reading::padded) return Pad(column, value);
-    if (readings_[column] != Reading::date) return;
-    date::DateTime& date = rooms_[column].date;
-    if (date::FromEngineText(value.Text(), &date) != 0 || date.month == 0) return;    // none, or a time alone
+void SqliteQuery::FillRowId(int column, Datum& value) {
+    RowId& row = rooms_[static_cast<std::size_t>(column)].row;
+    row = RowIdOf(value.integer);
+    SetView(value, Kind::row_id, &row, sizeof row);
+}
+
+// A text that is no date stays one, and so does a time alone.
+void SqliteQuery::FillDate(int column, Datum& value) {
+    date::DateTime& date = rooms_[static_cast<std::size_t>(column)].date;
+    if (date::FromEngineText(value.Text(), &date) != 0 || date.month == 0) return;
     SetView(value, Kind::timestamp, &date, sizeof date);
 }
 
-void SqliteQuery::FillBlob(std::size_t column, sqlite3_value* stored, Datum& value) {
-    const void* data = sqlite3_value_blob(stored);
-    SetView(value, Kind::bytes, data, static_cast<std::size_t>(sqlite3_value_bytes(stored)));
-    if (!data && value.length > 0) throw std::bad_alloc();
-    OCINumber& number = rooms_[column].number;
-    if (readings_[column] == Reading::bytes || !ReadNumberBlob(value.Text(), number)) return;
-    SetView(value, Kind::decimal, &number, sizeof number);
+void SqliteQuery::FillNumber(int column, Datum& value) {
+    OCINumber& number = rooms_[static_cast<std::size_t>(column)].number;
+    if (ReadNumberBlob(value.Text(), number)) SetView(value, Kind::decimal, &number, sizeof number);
 }
 
 // A fixed column's texts have its length, in characters or bytes.
-void SqliteQuery::Pad(std::size_t column, Datum& value) {
+void SqliteQuery::Pad(int index, Datum& value) {
+    const auto column = static_cast<std::size_t>(index);
     const std::size_t characters = columns_[column].characters;
     const std::size_t more = characters > 0 ? value.length - static_cast<std::size_t>(CharacterCount(value.Text())) : 0;
     const std::size_t size = (characters > 0 ? characters : columns_[column].size) + more;

@@ -74,9 +74,10 @@ private:
     void Drain(Status end) noexcept;
 
     void Fill();
-    void FillText(std::size_t column, sqlite3_value* stored, Datum& value);
-    void FillBlob(std::size_t column, sqlite3_value* stored, Datum& value);
-    void Pad(std::size_t column, Datum& value);
+    void FillRowId(int column, Datum& value);
+    void FillDate(int column, Datum& value);
+    void FillNumber(int column, Datum& value);
+    void Pad(int index, Datum& value);
 
     static Reading ReadingOf(const Column& column);
     void Describe();

@@ -16,8 +16,6 @@ namespace {
 
 // --- Memory callbacks ------------------------------------------------------------------------------------------------
 
-char my_context[] = "My  Context";
-
 void SayCalled(const char* callback, const void* context) {
     const char* text = context == nullptr ? "(null)" : static_cast<const char*>(context);
     Message(kOutput, "%s - Called by OCI - %s\n", callback, text);
@@ -46,11 +44,6 @@ struct Callbacks {
     OCIReallocFunction reallocate = nullptr;
     OCIFreeFunction free = nullptr;
 };
-
-void* ContextOf(const char* word) {
-    if (IsInvalid(word)) return InvalidObject();
-    return IsNull(word) ? nullptr : my_context;
-}
 
 // --- Environments ----------------------------------------------------------------------------------------------------
 
@@ -136,7 +129,7 @@ static_assert(std::ranges::all_of(kEnvironmentMakers, HasForms));
 // The context is always the same here, whatever its word.
 void Initialize(const CommandRow& row, int count, char** words) {
     Callbacks callbacks;
-    if (count > 2) callbacks = {my_context, MyMalloc, MyRealloc, MyFree};
+    if (count > 2) callbacks = {callback_context, MyMalloc, MyRealloc, MyFree};
     const sword rc = Call(&ClientLibrary::OCIInitialize, DecodeMode(words[1]), callbacks.context, callbacks.allocate,
                           callbacks.reallocate, callbacks.free);
     outputOCI(row.code, rc, "");

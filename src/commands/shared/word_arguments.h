@@ -58,6 +58,13 @@ inline void* ResolveEither(Kind first, Kind second, const char* name) {
     return FindObject(first, name, object) ? object : ResolveObject(second, name);
 }
 
+// What callbacks get as their context: a text of the driver's, the bad object or null.
+inline char callback_context[] = "My  Context";
+inline void* ContextOf(const char* word) {
+    if (IsInvalid(word)) return InvalidObject();
+    return IsNull(word) ? nullptr : callback_context;
+}
+
 // --- Places for what a call gives back -------------------------------------------------------------------------------
 
 // The place of an output that the word at `index`, where there is one, may refuse by "null".

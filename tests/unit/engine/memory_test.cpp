@@ -137,7 +137,8 @@ TEST_F(Memory, QueryThatCannotBeOpenedIsNotOpen) {
         std::unique_ptr<engine::Query> query;
         std::uint32_t offset = 0;
         const OCINumber number = Number("12345678901234567890.5");
-        Rows source{{Text("text"), Decimal(number), Moment({.year = 2024, .month = 2, .day = 29})}};
+        const date::DateTime moment{.year = 2024, .month = 2, .day = 29};
+        Rows source{{Text("text"), Decimal(number), Moment(moment)}};
         const int answer = Short(position, once, [&] {
             Status status = connection_->Compile({"select n, v, c, d, ?1, to_char(n), nvl(?2, 1) from t where d = ?3 "
                                                   "and to_char(d, 'YYYY') = '2024' and n < 10", Effect::reads, {}},

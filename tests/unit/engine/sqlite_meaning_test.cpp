@@ -91,6 +91,17 @@ protected:
 TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
     MakeTables();
     const struct { const char* sql; const char* text; const char* rows; } cases[] = {
+        {"select id from t where d <= %", "01-JAN-20", "2;"},
+        {"select id from t where % < t.d", "01-JAN-20", "1;"},
+        {"select id from t where d not between '01-JAN-00' and %", "31-DEC-20", "1;2;"},
+        {"select id from t where c not in (%)", "ab ", "2;"},
+        {"select id from t where c <> %", "abc     ", "1;"},
+        {"select id from t where n > %", "7", "2;"},
+        {"select id from t where n = %", "x", "!1722"},
+        {"select id from t where (d = % or 1 = 0)", "03-FEB-24", "1;"},
+        {"select id from t where substr(c, 1, 2) = %", "ab", "1;2;"},
+        {"select id from t where exists(select 1 from u where u.e > % and u.id = t.id)", "02-FEB-24 09.00.00 AM", "1;"},
+        {"select t.id from t, u x where t.id = x.id and e > %", "03-FEB-24 09.59.00 AM", "1;"},
         {"select id from t where (d) = %", "03-FEB-24", "1;"},
         {"select id from t where ((t.d)) = (%)", "03-FEB-24", "1;"},
         {"select id from t where d = ( ( % ) ) or (1 = 0)", "03-FEB-24", "1;"},

@@ -253,36 +253,6 @@ TEST_F(Sqlite, ErrorsHaveTheirNumbers) {
     EXPECT_FALSE(connection_->InTransaction());
 }
 
-// Each condition with its text as a literal and through a placeholder.
-TEST_F(Sqlite, ComparisonsReadValuesAsTheirColumns) {
-    ASSERT_EQ(Run("create table t(id integer, d date, c char(5), n number, r raw(2), v varchar2(9))"), 0);
-    ASSERT_EQ(Run("create table u(id integer, e timestamp, v number)"), 0);
-    ASSERT_EQ(Run("insert into t values(1, '03-FEB-24', 'ab', 5, '0A', 'x ')"), 0);
-    ASSERT_EQ(Run("insert into t values(2, '01-DEC-99', 'abc', 10, '0B', 'x')"), 0);
-    ASSERT_EQ(Run("insert into u values(1, '03-FEB-24 10.00.00 AM', 1)"), 0);
-    const struct { const char* condition; const char* text; const char* rows; } cases[] = {
-        {"d = %", "03-FEB-24", "1;"}, {"d <= %", "01-JAN-20", "2;"}, {"% < t.d", "01-JAN-20", "1;"},
-        {"d not between '01-JAN-00' and %", "31-DEC-20", "1;2;"}, {"d >= %", "tomorrow", "error 1858"},
-        {"c = %", "ab   ", "1;"}, {"c in ('q', %)", "ab ", "1;"}, {"c not in (%)", "ab ", "2;"},
-        {"c <> %", "abc     ", "1;"},
-        {"n > %", "7", "2;"}, {"n = %", "x", "error 1722"}, {"r = %", "0a", "1;"}, {"v = %", "x", "2;"},
-        {"(d = % or 1 = 0)", "03-FEB-24", "1;"}, {"substr(c, 1, 2) = %", "ab", "1;2;"},
-        {"exists(select 1 from u where u.e > % and u.id = t.id)", "02-FEB-24 09.00.00 AM", "1;"}};
-    for (const auto& c : cases) {
-        const std::string condition = c.condition;
-        const std::size_t place = condition.find('%');
-        const auto with = [&](const std::string& value) { return std::string(condition).replace(place, 1, value); };
-        const auto query = [&](const std::string& value) { return "select id from t where " + with(value); };
-        const std::string want = c.rows;
-        EXPECT_EQ(Query(query('\'' + std::string(c.text) + '\'')), want) << condition << ' ' << c.text;
-        EXPECT_EQ(Query(query("?1"), {Text(c.text)}), want) << "bound " << condition << ' ' << c.text;
-        if (want[0] == 'e') continue;
-        EXPECT_EQ(Run("update t set n = n where " + with('\'' + std::string(c.text) + '\'')), 0) << condition;
-    }
-    EXPECT_EQ(Query("select t.id from t, u x where t.id = x.id and e > '03-FEB-24 09.59.00 AM'"), "1;");
-    EXPECT_EQ(Query("select t.id from t join u on t.id = u.id where t.v = 'x '"), "1;") << "two columns, two types";
-}
-
 TEST_F(Sqlite, RefusedValueNamesItsColumn) {
     ASSERT_EQ(Run("create table t(v varchar2(3))"), 0);
     Rows rows{{Text("long")}};
