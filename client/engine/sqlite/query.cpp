@@ -202,43 +202,51 @@ Status SqliteQuery::Step(bool& has_row) {
 
 // ---- Changes
 
-// Steps through an execution; its rows go to the sink.
-Status SqliteQuery::RunRow(std::uint32_t row, RowSink* returned) {
+// Steps through an execution whose rows go to the sink.
+Status SqliteQuery::DeliverRows(std::uint32_t row, RowSink& sink) {
     bool has_row = false;
     Status status = Step(has_row);
-    if (has_row && returned) Columns();
-    while (has_row) {
-        if (returned) {
-            Fill();
-            status = returned->Row(row, values_);
-        }
+    if (has_row) Columns();
+    while (has_row && status.Ok()) {
+        Fill();
+        status = sink.Row(row, values_);
         if (status.Ok()) status = Step(has_row);
-        if (!status.Ok()) break;
     }
     return status;
 }
 
-// What a sink refuses must be undone, which SQLite does for its own failures alone: then the execution has a mark.
+// What a sink refuses must be undone, which SQLite does for its own failures alone: the execution gets a mark.
+Status SqliteQuery::RunReturning(std::uint32_t row, RowSink& sink) {
+    const bool marked = connection_.InTransaction();
+    Status status = marked ? connection_.SetMark() : Status();
+    if (!status.Ok()) return status;
+    try {
+        status = DeliverRows(row, sink);
+    } catch (const std::bad_alloc&) {
+        status = NoMemory();
+    }
+    sqlite3_reset(statement_.get());    // a statement that runs holds its marks
+    if (status.Ok() && marked) status = connection_.DropMark();
+    if (status.Ok() || !marked || !connection_.InTransaction()) return status;
+    Status undone = connection_.UndoToMark();
+    if (undone.Ok()) undone = connection_.DropMark();
+    return undone.Ok() ? status : undone;
+}
+
 Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) {
     Status status = BindRow(source, row, false);
     if (!status.Ok()) return status;
-    const bool marked = returned && connection_.InTransaction() && sqlite3_column_count(statement_.get()) > 0;
-    if (marked) status = connection_.SetMark();
-    if (!status.Ok()) return status;
-    try {
-        status = RunRow(row, returned);
-    } catch (const std::bad_alloc&) {
-        status = NoMemory();
+    if (returned && sqlite3_column_count(statement_.get()) > 0) {
+        status = RunReturning(row, *returned);
+    } else {
+        bool has_row = true;
+        while (has_row && status.Ok()) status = Step(has_row);
+        sqlite3_reset(statement_.get());
     }
     if (status.Ok() && verb_ != Verb::other) {
         affected += static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
     }
-    sqlite3_reset(statement_.get());
-    if (!marked || !connection_.InTransaction()) return status;
-    Status undone = status.Ok() ? Status() : connection_.UndoToMark();
-    Status dropped = connection_.InTransaction() ? connection_.DropMark() : Status();
-    if (undone.Failed()) return undone;
-    return status.Ok() ? dropped : status;
+    return status;
 }
 
 Status SqliteQuery::TryRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) noexcept {

@@ -62,7 +62,8 @@ private:
     Status BindRow(RowSource& source, std::uint32_t row, bool copy);
     Status ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected);
     Status TryRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) noexcept;
-    Status RunRow(std::uint32_t row, RowSink* returned);
+    Status RunReturning(std::uint32_t row, RowSink& sink);
+    Status DeliverRows(std::uint32_t row, RowSink& sink);
     Status Step(bool& has_row);
     Status Start(RowSource& source, std::uint32_t row, bool& has_row);
 
