@@ -3,6 +3,7 @@
 #include <atomic>
 #include <chrono>
 #include <functional>
+#include <ostream>
 #include <set>
 #include <thread>
 
@@ -18,6 +19,7 @@ struct Engine {
     std::string (*fresh_database)(const std::string& folder);
     bool shared;    // several sessions see the same tables
 };
+void PrintTo(const Engine& engine, std::ostream* out) { *out << engine.name; }
 
 class Contract : public EngineFixture, public testing::WithParamInterface<Engine> {
 protected:
