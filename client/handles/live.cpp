@@ -117,6 +117,11 @@ bool Contains(const void* pointer) noexcept {
     return FindSlot(writer.InUse(), pointer) != nullptr;
 }
 
+std::size_t TableCount() noexcept {
+    const std::lock_guard lock(TheWriter().mutex);
+    return TheWriter().tables.size();
+}
+
 bool Erase(const void* pointer) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);

@@ -29,7 +29,9 @@ constexpr unsigned kKindBits = 8;
 constexpr Word kEmpty = 0;
 constexpr Word kErased = ~Word{0} << kKindBits;    // no object lies there
 
-inline Word AddressOf(const void* pointer) { return std::rotr(static_cast<Word>(reinterpret_cast<std::uintptr_t>(pointer)), 4); }
+inline Word AddressOf(const void* pointer) {
+    return std::rotr(static_cast<Word>(reinterpret_cast<std::uintptr_t>(pointer)), 4);
+}
 constexpr Word AddressIn(Word word) { return word >> kKindBits; }
 constexpr Kind KindIn(Word word) { return static_cast<Kind>(word & 0xFF); }
 
@@ -72,5 +74,6 @@ bool Erase(const void* pointer) noexcept;    // false when it is not in the set
 // Nothing for an object that another thread has erased. As Kind::none an object stays in the set, but is not found.
 void Retype(const void* pointer, Kind kind) noexcept;
 bool Contains(const void* pointer) noexcept;    // of any kind, Kind::none too
+std::size_t TableCount() noexcept;              // tables that are not freed yet, the one in use included
 
 }  // namespace live

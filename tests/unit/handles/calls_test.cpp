@@ -236,6 +236,36 @@ TEST_F(CallsTest, ErrorTextIsCutAndTerminatedInAnyBuffer) {
         << "asking about the handle keeps its records";
 }
 
+// A message beyond what callers have room for is cut to that, and still ends its line.
+TEST_F(CallsTest, LongMessagesEndTheirLine) {
+    for (const ub4 mode : {ub4{OCI_DEFAULT}, ub4{OCI_UTF16}}) {
+        OCIEnv* env = NewEnvironment(mode);
+        OCIError* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
+        const std::size_t unit = mode == OCI_UTF16 ? 2 : 1;
+        ASSERT_EQ(OCIFileInit(env, err), OCI_SUCCESS);
+        for (const std::size_t length : {100, 400, 500, 900, 1000, 2000}) {
+            std::string name;
+            for (std::size_t index = 0; index <= length; ++index) {
+                name += index < length ? 'n' : '\0';
+                if (unit == 2) name += '\0';
+            }
+            OCIFileObject* file = nullptr;
+            EXPECT_EQ(OCIFileOpen(env, err, &file, reinterpret_cast<OraText*>(name.data()), nullptr,
+                                  OCI_FILE_READ_ONLY, OCI_FILE_EXIST, OCI_FILE_BIN), OCI_ERROR);
+            std::string text(OCI_ERROR_MAXMSG_SIZE, 'x');
+            EXPECT_EQ(OCIErrorGet(err, 1, nullptr, nullptr, reinterpret_cast<OraText*>(text.data()),
+                                  OCI_ERROR_MAXMSG_SIZE, OCI_HTYPE_ERROR), OCI_SUCCESS) << mode << ' ' << length;
+            std::string line;
+            for (std::size_t at = 0; at < text.size() && text[at] != '\0'; at += unit) line += text[at];
+            EXPECT_EQ(line.find('\n'), line.size() - 1) << mode << ' ' << length << ": " << line;
+            const std::size_t longest = OCI_ERROR_MAXMSG_SIZE / unit - 1;
+            EXPECT_EQ(line.size() == longest, length + 40 >= longest) << mode << ' ' << length << ": " << line.size();
+        }
+        ASSERT_EQ(OCIFileTerm(env, err), OCI_SUCCESS);
+        EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    }
+}
+
 TEST_F(CallsTest, Utf16TextsBothWays) {
     OCIEnv* env = NewEnvironment(OCI_UTF16);
     OCIError* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);

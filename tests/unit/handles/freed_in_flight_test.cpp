@@ -3,6 +3,7 @@
 
 #include <atomic>
 #include <barrier>
+#include <cstdlib>
 #include <thread>
 #include <vector>
 
@@ -28,7 +29,7 @@ struct Shared {
     void Make() {
         ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
         New(err, OCI_HTYPE_ERROR);
-        ASSERT_EQ(OCILogon(env, err, &svc, Text("kelp"), 4, Text("kelp"), 4, Text(":memory:"), 8), OCI_SUCCESS);
+        ASSERT_EQ(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(":memory:"), 8), OCI_SUCCESS);
         New(stmt, OCI_HTYPE_STMT);
         ASSERT_EQ(OCIStmtPrepare(stmt, err, Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
         ASSERT_EQ(OCIStringAssignText(env, err, Text("kelp"), 4, &string), OCI_SUCCESS);
@@ -177,6 +178,58 @@ TEST(ServerHandles, BrokenAndDetachedWhileASessionIsFreed) {
     }
     EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
     EXPECT_EQ(OCI_memGetMemCount(), before);
+}
+
+// The memory functions of an environment in which an allocation waits until it may go on: a call that is in.
+struct Gate {
+    std::atomic<bool> armed{false}, in{false}, open{false};
+
+    static dvoid* Allocate(dvoid* context, size_t size) {
+        auto& gate = *static_cast<Gate*>(context);
+        if (gate.armed) {
+            gate.in = true;
+            while (!gate.open) std::this_thread::yield();
+        }
+        return std::malloc(size);
+    }
+    static void Free(dvoid*, dvoid* memory) { std::free(memory); }
+};
+
+// A statement with open rows is freed while a call elsewhere is in, so that the end of that call destroys it, in its own
+// thread, beside a thread that works on the statement's session and then logs off.
+TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
+    const sb4 before = OCI_memGetMemCount();
+    for (int round = 0; round < 100; ++round) {
+        Shared shared;
+        shared.Make();
+        OCIStmt* other = nullptr;
+        shared.New(other, OCI_HTYPE_STMT);
+        const OraText* sql = Text("select 1 from dual union all select 2 from dual");
+        ASSERT_EQ(OCIStmtPrepare(shared.stmt, shared.err, sql, 47, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIStmtPrepare(other, shared.err, sql, 47, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIStmtExecute(shared.svc, shared.stmt, shared.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), 0);
+        Gate gate;
+        OCIEnv* elsewhere = nullptr;
+        ASSERT_EQ(OCIEnvCreate(&elsewhere, OCI_THREADED, &gate, Gate::Allocate, nullptr, Gate::Free, 0, nullptr), 0);
+        gate.armed = true;
+        std::thread in([&] {
+            dvoid* handle = nullptr;
+            EXPECT_EQ(OCIHandleAlloc(elsewhere, &handle, OCI_HTYPE_ERROR, 0, nullptr), OCI_SUCCESS);
+        });
+        while (!gate.in) std::this_thread::yield();
+        EXPECT_EQ(OCIHandleFree(shared.stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
+        std::thread working([&] {
+            gate.open = true;
+            for (int call = 0; call < round % 10; ++call)
+                EXPECT_EQ(OCIStmtExecute(shared.svc, other, shared.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), 0);
+            EXPECT_EQ(OCILogoff(shared.svc, shared.err), OCI_SUCCESS);
+        });
+        in.join();
+        working.join();
+        EXPECT_EQ(OCIHandleFree(elsewhere, OCI_HTYPE_ENV), OCI_SUCCESS);
+        EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+        ASSERT_EQ(OCI_memGetMemCount(), before) << "round " << round;
+    }
 }
 
 }  // namespace
