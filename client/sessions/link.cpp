@@ -23,10 +23,12 @@ std::shared_ptr<Link> LinkShare::Set(std::shared_ptr<Link> link) noexcept {
 
 LinkUser::~LinkUser() { Use(nullptr); }
 
+// The share changes last: whoever destroys the user waits for the lock of the link that it shows.
 void LinkUser::Use(std::shared_ptr<Link> link) noexcept {
     if (link == UsedLink()) return;
-    if (const std::shared_ptr<Link> before = link_.Set(std::move(link))) before->Remove(*this);
-    if (UsedLink()) UsedLink()->Add(*this);
+    if (UsedLink()) UsedLink()->Remove(*this);
+    if (link) link->Add(*this);
+    link_.Set(std::move(link));
 }
 
 Link::Link(std::shared_ptr<engine::Database> database, std::unique_ptr<engine::Connection> connection,

@@ -1,0 +1,351 @@
+// Sessions: what their end does to the work done in them, what attributes tell of them, and several threads that begin,
+// use, break and end the same ones.
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <barrier>
+#include <chrono>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <functional>
+#include <future>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "kelpci.h"
+#include "oci.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+
+const OraText* Text(const char* text) { return reinterpret_cast<const OraText*>(text); }
+ub4 Length(const char* text) { return text ? static_cast<ub4>(std::strlen(text)) : 0; }
+
+// Two threads that wait for each other without sleeping, so that they go on in the same moment.
+class Turn {
+public:
+    void Wait() {
+        const int until = (came_.fetch_add(1) / 2 + 1) * 2;
+        for (int spin = 0; came_ < until; ++spin)
+            if (spin > 100'000) std::this_thread::yield();
+    }
+
+private:
+    std::atomic<int> came_{0};
+};
+
+class Sessions : public testing::Test {
+protected:
+    void SetUp() override {
+        char name[] = "/tmp/kelp-sessions-XXXXXX";
+        folder_ = mkdtemp(name);
+        setenv("KELPCI_HOME", folder_.c_str(), 1);
+        ASSERT_EQ(OCIEnvCreate(&env_, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+        err_ = New<OCIError>(OCI_HTYPE_ERROR);
+    }
+    void TearDown() override {
+        EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
+        EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
+        std::filesystem::remove_all(folder_);
+    }
+
+    template <class T>
+    T* New(ub4 type) const {
+        dvoid* handle = nullptr;
+        EXPECT_EQ(OCIHandleAlloc(env_, &handle, type, 0, nullptr), OCI_SUCCESS) << type;
+        return static_cast<T*>(handle);
+    }
+    // 0, or the number of the error; the return code itself when there is no record.
+    static sb4 Answer(sword rc, OCIError* err) {
+        sb4 number = 0;
+        if (rc == OCI_SUCCESS) return 0;
+        return OCIErrorGet(err, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR) == OCI_SUCCESS ? number : rc;
+    }
+    sb4 Answer(sword rc) const { return Answer(rc, err_); }
+    sb4 Run(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, const char* sql, ub4 iterations) const {
+        const sb4 prepared =
+            Answer(OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), err);
+        if (prepared != 0) return prepared;
+        return Answer(OCIStmtExecute(svc, stmt, err, iterations, 0, nullptr, nullptr, OCI_DEFAULT), err);
+    }
+    sb4 Run(OCISvcCtx* svc, const char* sql) const {
+        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        const sb4 answer = Run(svc, stmt, err_, sql, 1);
+        OCIHandleFree(stmt, OCI_HTYPE_STMT);
+        return answer;
+    }
+    // The number that a query answers; below 0 what it answers instead.
+    sb4 Count(OCISvcCtx* svc, const char* sql) const {
+        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        OCIDefine* define = nullptr;
+        sb4 count = 0;
+        sb4 answer = Answer(OCIStmtPrepare(stmt, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT));
+        if (answer == 0) answer = Answer(OCIDefineByPos(stmt, &define, err_, 1, &count, sizeof count, SQLT_INT, nullptr,
+                                                        nullptr, nullptr, OCI_DEFAULT));
+        if (answer == 0) answer = Answer(OCIStmtExecute(svc, stmt, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
+        OCIHandleFree(stmt, OCI_HTYPE_STMT);
+        return answer == 0 ? count : -answer;
+    }
+    sb4 LogOn(OCISvcCtx** svc, const char* database, OCIError* err) const {
+        return Answer(OCILogon(env_, err, svc, nullptr, 0, nullptr, 0, Text(database), Length(database)), err);
+    }
+    sb4 LogOn(OCISvcCtx** svc, const char* database) const { return LogOn(svc, database, err_); }
+    OCIServer* NewServer(const char* database) const {
+        auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+        EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(database), static_cast<sb4>(Length(database)), 0)), 0);
+        return server;
+    }
+    OCISvcCtx* NewContext(OCIServer* server, OCISession* session) const {
+        auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+        EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
+        EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION, err_)), 0);
+        return svc;
+    }
+    template <class T>
+    T Attribute(const dvoid* handle, ub4 type, ub4 attribute) const {
+        T value{};
+        EXPECT_EQ(Answer(OCIAttrGet(handle, type, &value, nullptr, attribute, err_)), 0) << attribute;
+        return value;
+    }
+    // work(index, error handle) in threads of their own, let go together. Ends the process when they hang.
+    void AtOnce(int count, const std::function<void(int, OCIError*)>& work) const {
+        std::barrier start(count);
+        std::vector<std::future<void>> done;
+        for (int index = 0; index < count; ++index) {
+            auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+            done.push_back(std::async(std::launch::async, [&, index, err] {
+                start.arrive_and_wait();
+                work(index, err);
+                OCIHandleFree(err, OCI_HTYPE_ERROR);
+            }));
+        }
+        for (std::future<void>& thread : done) {
+            if (thread.wait_for(10s) == std::future_status::ready) continue;
+            ADD_FAILURE() << "the threads wait for each other";
+            std::abort();
+        }
+    }
+
+    std::string folder_;
+    OCIEnv* env_ = nullptr;
+    OCIError* err_ = nullptr;
+};
+
+TEST_F(Sessions, TheEndCommitsAndADetachRollsBack) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, "work"), 0);
+    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
+    ASSERT_EQ(Run(svc, "insert into t values(1)"), 0);
+    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    ASSERT_EQ(LogOn(&svc, "work"), 0);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 1) << "a logoff commits";
+
+    OCIServer* server = NewServer("work");
+    auto* session = New<OCISession>(OCI_HTYPE_SESSION);
+    OCISvcCtx* explicit_svc = NewContext(server, session);
+    ASSERT_EQ(Answer(OCISessionBegin(explicit_svc, err_, session, OCI_CRED_EXT, 0)), 0);
+    ASSERT_EQ(Run(explicit_svc, "insert into t values(2)"), 0);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 1);
+    ASSERT_EQ(Answer(OCISessionEnd(explicit_svc, err_, session, 0)), 0);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "the end of a session commits";
+
+    ASSERT_EQ(Answer(OCISessionBegin(explicit_svc, err_, session, OCI_CRED_EXT, 0)), 0);
+    ASSERT_EQ(Run(explicit_svc, "insert into t values(3)"), 0);
+    ASSERT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "a detach drops what is open";
+    ASSERT_EQ(Run(svc, "insert into t values(4)"), 0);
+    ASSERT_EQ(OCIHandleFree(svc, OCI_HTYPE_SVCCTX), OCI_SUCCESS);
+    svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, "work"), 0);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "and so does freeing the context";
+}
+
+// The database of a server in memory lives as long as the server is attached.
+TEST_F(Sessions, AServerInMemoryKeepsItsDatabaseBetweenSessions) {
+    OCIServer* server = NewServer(":memory:");
+    auto* session = New<OCISession>(OCI_HTYPE_SESSION);
+    OCISvcCtx* svc = NewContext(server, session);
+    const auto begin = [&](const char* password) {
+        EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char*>("ann"), 3, OCI_ATTR_USERNAME, err_)),
+                  0);
+        EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char*>(password), Length(password),
+                                    OCI_ATTR_PASSWORD, err_)), 0);
+        return Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0));
+    };
+    ASSERT_EQ(begin("secret"), 0);
+    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
+    ASSERT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 0);
+    EXPECT_EQ(begin("wrong"), 1017);
+    EXPECT_EQ(Run(svc, "select n from t"), 1012);
+    ASSERT_EQ(begin("secret"), 0);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 0) << "the table is still there";
+    ASSERT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 0);
+}
+
+TEST_F(Sessions, AttributesFollowWhatHappens) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text("here"), 4, OCI_LOGON2_STMTCACHE)), 0);
+    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
+    auto* session = Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
+    const auto open = [&] { return Attribute<ub4>(session, OCI_HTYPE_SESSION, OCI_ATTR_NUM_OPEN_STMTS); };
+    EXPECT_EQ(open(), 0u);
+    OCIStmt* statements[2];
+    for (OCIStmt*& stmt : statements) {
+        stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        ASSERT_EQ(Run(svc, stmt, err_, "select 1 from dual", 0), 0);
+    }
+    EXPECT_EQ(open(), 2u);
+    ASSERT_EQ(Run(svc, statements[0], err_, "select 2 from dual", 0), 0);
+    EXPECT_EQ(open(), 2u) << "executed again";
+    ub4 row = 0;
+    OCIDefine* define = nullptr;
+    ASSERT_EQ(Answer(OCIDefineByPos(statements[0], &define, err_, 1, &row, sizeof row, SQLT_INT, nullptr, nullptr,
+                                    nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIStmtFetch2(statements[0], err_, 0, OCI_FETCH_NEXT, 0, OCI_DEFAULT)), 0);
+    EXPECT_EQ(open(), 1u) << "given up by a fetch of no rows";
+    ASSERT_EQ(OCIHandleFree(statements[1], OCI_HTYPE_STMT), OCI_SUCCESS);
+    EXPECT_EQ(open(), 0u);
+    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    EXPECT_EQ(open(), 0u);
+    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 0u) << "goes with the logon";
+
+    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+    const auto database = [&] {
+        const char* name = nullptr;
+        ub4 length = 9;
+        EXPECT_EQ(Answer(OCIAttrGet(server, OCI_HTYPE_SERVER, &name, &length, OCI_ATTR_DBNAME, err_)), 0);
+        return std::string(name ? name : "", length);
+    };
+    EXPECT_EQ(database(), "");
+    ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text("here"), 4, 0)), 0);
+    EXPECT_EQ(database(), "here");
+    ASSERT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
+    EXPECT_EQ(database(), "") << "detached";
+}
+
+// ---- Several threads
+
+TEST_F(Sessions, TwoThreadsEndEachOthersSessions) {
+    OCIServer* server = NewServer(":memory:");
+    OCISession* sessions[2];
+    OCISvcCtx* contexts[2];
+    for (int index = 0; index < 2; ++index) {
+        sessions[index] = New<OCISession>(OCI_HTYPE_SESSION);
+        contexts[index] = NewContext(server, sessions[index]);
+    }
+    Turn turn;
+    AtOnce(2, [&](int index, OCIError* err) {
+        for (int round = 0; round < 2000; ++round) {
+            EXPECT_EQ(Answer(OCISessionBegin(contexts[index], err, sessions[index], OCI_CRED_EXT, 0), err), 0);
+            turn.Wait();
+            EXPECT_EQ(Answer(OCISessionEnd(contexts[index], err, sessions[1 - index], 0), err), 0);
+            turn.Wait();
+        }
+    });
+}
+
+TEST_F(Sessions, OneOfTwoThreadsBeginsASession) {
+    OCIServer* server = NewServer(":memory:");
+    auto* session = New<OCISession>(OCI_HTYPE_SESSION);
+    OCISvcCtx* contexts[] = {NewContext(server, session), NewContext(server, session)};
+    Turn turn;
+    sb4 answers[2];
+    AtOnce(2, [&](int index, OCIError* err) {
+        for (int round = 0; round < 2000; ++round) {
+            turn.Wait();
+            answers[index] = Answer(OCISessionBegin(contexts[index], err, session, OCI_CRED_EXT, 0), err);
+            turn.Wait();
+            if (index == 0) {
+                EXPECT_EQ(std::min(answers[0], answers[1]), 0) << "round " << round;
+                EXPECT_EQ(std::max(answers[0], answers[1]), 24313) << "round " << round;
+                EXPECT_EQ(Answer(OCIPing(contexts[1], err, 0), err), 0);
+                EXPECT_EQ(Answer(OCISessionEnd(contexts[0], err, session, 0), err), 0);
+            }
+        }
+    });
+}
+
+// One thread logs on and off on a context, the others use it: whatever they find, it is one of the two states.
+TEST_F(Sessions, UsedWhileAThreadLogsOnAndOff) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, "here"), 0);
+    std::atomic<bool> stop{false};
+    const auto among = [](sb4 answer, std::initializer_list<sb4> allowed) {
+        EXPECT_TRUE(std::find(allowed.begin(), allowed.end(), answer) != allowed.end()) << answer;
+    };
+    AtOnce(5, [&](int index, OCIError* err) {
+        if (index == 0) {
+            OCISvcCtx* own = svc;
+            for (const auto end = std::chrono::steady_clock::now() + 1s; std::chrono::steady_clock::now() < end;) {
+                among(Answer(OCILogoff(svc, err), err), {0, 1013});
+                EXPECT_EQ(LogOn(&own, "here", err), 0);
+                EXPECT_EQ(own, svc);
+            }
+            stop = true;
+        }
+        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        while (!stop) {
+            OCISession* session = nullptr;
+            OCIStmt* prepared = nullptr;
+            switch (index) {
+                case 1:
+                    among(Answer(OCIBreak(svc, err), err), {0, 1012, 3114});
+                    among(Answer(OCIReset(svc, err), err), {0, 1012, 3114});
+                    break;
+                case 2: among(Run(svc, stmt, err, "select 1 from dual", 0), {0, 1012, 1013, 3114}); break;
+                case 3:
+                    EXPECT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err), err),
+                              0);
+                    among(Answer(OCIPing(svc, err, 0), err), {0, 1012, 1013, 3114});
+                    break;
+                default:
+                    among(Answer(OCIStmtPrepare2(svc, &prepared, err, Text("select 2 from dual"), 18, nullptr, 0,
+                                                 OCI_NTV_SYNTAX, OCI_DEFAULT), err), {0, 1012, 3114});
+                    if (prepared) OCIStmtRelease(prepared, err, nullptr, 0, OCI_DEFAULT);
+            }
+        }
+    });
+    EXPECT_EQ(Answer(OCIReset(svc, err_)), 0);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
+    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+}
+
+TEST_F(Sessions, TwoThreadsLogOnAndOffOnOneContext) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, "here"), 0);
+    AtOnce(2, [&](int, OCIError* err) {
+        OCISvcCtx* own = svc;
+        for (int round = 0; round < 100; ++round) {
+            EXPECT_EQ(LogOn(&own, "here", err), 0) << "round " << round;
+            const sb4 answer = Answer(OCILogoff(own, err), err);
+            EXPECT_TRUE(answer == 0 || answer == 3114) << answer << ": the other has";
+        }
+    });
+    ASSERT_EQ(LogOn(&svc, "here"), 0);
+    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
+}
+
+TEST_F(Sessions, AttachedDetachedAndAskedByThreads) {
+    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+    AtOnce(3, [&](int index, OCIError* err) {
+        for (int round = 0; round < 300; ++round) {
+            const char* name = nullptr;
+            ub4 status = 0;
+            OraText version[200];
+            switch (index) {
+                case 0: OCIServerAttach(server, err, Text("here"), 4, 0); break;
+                case 1: OCIServerDetach(server, err, 0); break;
+                default:
+                    EXPECT_EQ(OCIAttrGet(server, OCI_HTYPE_SERVER, &name, nullptr, OCI_ATTR_DBNAME, err), OCI_SUCCESS);
+                    EXPECT_EQ(OCIAttrGet(server, OCI_HTYPE_SERVER, &status, nullptr, OCI_ATTR_SERVER_STATUS, err),
+                              OCI_SUCCESS);
+                    OCIServerVersion(server, err, version, sizeof version, OCI_HTYPE_SERVER);
+            }
+        }
+    });
+}
+
+}  // namespace
