@@ -1,4 +1,6 @@
 // Connections and user sessions: logon, server attach, session begin, password change, versions, ping, break, reset.
+// What begins or ends a session, or works on one, enters without the gate's lock and takes the locks of sessions/ itself,
+// one link's at a time: a session may be another context's, and another thread may end it meanwhile.
 #include <string>
 
 #include "entry/text_argument.h"
@@ -67,21 +69,16 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
     if (status.Failed()) return status;
 
     auto* service = Live<ServiceContext>(*out);
-    const bool is_new = !service;
-    if (is_new) service = Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0);
-    const SerialLock lock(*service);
-    try {
-        status = service->LogOn(database, credentials);
-    } catch (...) {
-        if (is_new) Destroy(service);
-        throw;
+    Made<ServiceContext> made;
+    if (!service) {
+        made.reset(Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0));
+        service = made.get();
     }
-    if (status.Failed()) {
-        if (is_new) Destroy(service);
-        return status;
-    }
+    status = service->LogOn(database, credentials);
+    if (status.Failed()) return status;
     if (mode & OCI_LOGON2_STMTCACHE) service->statement_cache_size = ServiceContext::kDefaultCacheSize;
     *out = AsHandle<OCISvcCtx>(service);
+    (void)made.release();
     return status;
 }
 
@@ -107,10 +104,11 @@ Status ChangePasswordAndLogOn(ServiceContext& service, const std::string& user, 
     if (status.Failed()) return status;
     Session* set = service.GetSession();
     Session& session = set ? *set : service.OwnSession();
-    if (session.Begun()) return session.GetLink()->Engine().ChangePassword(user, old_password, new_password);
-    status = session.Begin(*server, {user, old_password, false});
-    if (status.Failed()) return status;
-    status = session.GetLink()->Engine().ChangePassword(user, old_password, new_password);
+    const Status begun = session.Begin(*server, {user, old_password, false});
+    const bool before = begun.Number() == errors::kAlreadyAuthenticated;
+    if (begun.Failed() && !before) return begun;
+    status = session.ChangePassword(user, old_password, new_password);
+    if (before) return status;
     if (status.Failed()) {
         session.Drop();
         return status;
@@ -131,20 +129,20 @@ Status ChangePassword(ServiceContext& service, PasswordTexts& texts, ub4 mode) {
         if (texts.user.empty()) return Error(errors::kBadLogon);
         return ChangePasswordAndLogOn(service, texts.user, texts.old_password, texts.new_password);
     }
-    std::shared_ptr<Link> link;
-    Status status = service.Require(link);
-    if (status.Failed()) return status;
-    if (texts.user.empty()) texts.user = link->user;
+    const SessionTurn turn(service);
+    if (turn.status.Failed()) return turn.status;
+    if (texts.user.empty()) texts.user = turn.link->user;
     if (texts.user.empty()) return Error(errors::kBadLogon);
-    return link->Engine().ChangePassword(texts.user, texts.old_password, texts.new_password);
+    return turn.link->Engine().ChangePassword(texts.user, texts.old_password, texts.new_password);
 }
 
 // The version text of the server that a service context or a server handle is attached to.
 Status VersionText(Object& object, std::string& text) {
-    Server* server = Live<Server>(&object);
-    if (auto* service = Live<ServiceContext>(&object)) {
-        Status status = service->RequireServer(server);
-        if (status.Failed()) return status;
+    Server* server = nullptr;
+    if (object.Type() == OCI_HTYPE_SERVER) {
+        server = static_cast<Server*>(&object);
+    } else if (Status status = static_cast<ServiceContext&>(object).RequireServer(server); status.Failed()) {
+        return status;
     }
     const std::shared_ptr<engine::Database> database = server->AttachedDatabase();
     if (!database) return Error(errors::kNotConnected);
@@ -156,17 +154,20 @@ Status VersionText(Object& object, std::string& text) {
 // OCIBreak comes from another thread while a call holds it.
 sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
     return EnterError(errhp, [&](ErrorHandle&) -> Status {
-        Server* server = Live<Server>(handle);
-        if (auto* service = Live<ServiceContext>(handle)) {
-            Session* session = service->GetSession();
+        Object* object = LiveOneOf(handle, Kind::server, Kind::service_context);
+        if (!object) return InvalidHandle();
+        if (object->Type() == OCI_HTYPE_SVCCTX) {
+            auto& service = static_cast<ServiceContext&>(*object);
+            Server* server = nullptr;
+            const Session* session = service.GetSession();
             const std::shared_ptr<Link> link = session ? session->ShareLink() : nullptr;
-            if (!link) return service->RequireServer(server);
+            if (!link) return service.RequireServer(server);
             act(*link);
             return {};
         }
-        if (!server) return InvalidHandle();
-        if (!server->Attached()) return Error(errors::kNotConnected);
-        for (const std::shared_ptr<Link>& link : server->Links()) act(*link);
+        const auto& server = static_cast<Server&>(*object);
+        if (!server.Attached()) return Error(errors::kNotConnected);
+        for (const std::shared_ptr<Link>& link : server.Links()) act(*link);
         return {};
     });
 }
@@ -181,16 +182,21 @@ sword OCILogon(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* us
 sword OCILogon2(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw,
                 ub4 pwLen, const OraText* db, ub4 dbLen, ub4 mode) {
     return Enter<Environment>(env, err, [&](Environment& environment) {
+        const LongCall may_take_long;
         return LogOn(environment, svcOut, {user, userLen, pw, pwLen, db, dbLen}, mode);
     });
 }
 
 sword OCILogoff(OCISvcCtx* svc, OCIError* err) {
-    return Enter<ServiceContext>(svc, err, [](ServiceContext& service) { return service.LogOff(); });
+    return EnterUnlocked<ServiceContext>(svc, err, [](ServiceContext& service) {
+        const LongCall may_take_long;
+        return service.LogOff();
+    });
 }
 
 sword OCIServerAttach(OCIServer* srv, OCIError* err, const OraText* db, sb4 dbLen, ub4 mode) {
     return Enter<Server>(srv, err, [&](Server& server) -> Status {
+        const LongCall may_take_long;
         if (mode & OCI_CPOOL) return Error(errors::kNoConnectionPool);
         if (mode != OCI_DEFAULT) return Error(errors::kBadMode);
         if (dbLen < 0) return Error(errors::kNullArgument);
@@ -202,26 +208,32 @@ sword OCIServerAttach(OCIServer* srv, OCIError* err, const OraText* db, sb4 dbLe
 
 // The mode is not looked at: applications pass modes of environments here.
 sword OCIServerDetach(OCIServer* srv, OCIError* err, ub4) {
-    return Enter<Server>(srv, err, [](Server& server) { return server.Detach(); });
+    return Enter<Server>(srv, err, [](Server& server) {
+        const LongCall may_take_long;
+        return server.Detach();
+    });
 }
 
 sword OCISessionBegin(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4 credentials, ub4 mode) {
-    return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
+    return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext& service) {
         auto* session = Live<Session>(ses);
+        const LongCall may_take_long;
         return session ? BeginSession(service, *session, credentials, mode) : InvalidHandle();
     });
 }
 
 sword OCISessionEnd(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4) {
-    return Enter<ServiceContext>(svc, err, [&](ServiceContext&) {
+    return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext&) {
         auto* session = Live<Session>(ses);
+        const LongCall may_take_long;
         return session ? session->End() : InvalidHandle();
     });
 }
 
 sword OCIPasswordChange(OCISvcCtx* svc, OCIError* err, const OraText* user, ub4 userLen, const OraText* oldPw,
                         ub4 oldLen, const OraText* newPw, sb4 newLen, ub4 mode) {
-    return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
+    return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext& service) {
+        const LongCall may_take_long;
         PasswordTexts texts;
         const Environment& environment = service.Env();
         Status status = ReadText(environment, user, userLen, texts.user);
@@ -243,10 +255,10 @@ sword OCIServerVersion(dvoid* hndl, OCIError* err, OraText* buf, ub4 bufsize, ub
 }
 
 sword OCIPing(OCISvcCtx* svc, OCIError* err, ub4) {
-    return Enter<ServiceContext>(svc, err, [](ServiceContext& service) {
-        std::shared_ptr<Link> link;
-        Status status = service.Require(link);
-        return status.Ok() ? link->Engine().Ping() : status;
+    return EnterUnlocked<ServiceContext>(svc, err, [](ServiceContext& service) {
+        const LongCall may_take_long;
+        const SessionTurn turn(service);
+        return turn.link ? turn.link->Engine().Ping() : turn.status;
     });
 }
 

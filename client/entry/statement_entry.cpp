@@ -35,6 +35,7 @@ Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 
     if (!text.Valid() || !tag.Valid()) return Error(errors::kBadText);
     Statement* statement = nullptr;
     const bool search_only = mode & OCI_PREP2_CACHE_SEARCHONLY;
+    const SessionTurn turn(service);
     Status status = PrepareThroughCache(service, {text.View(), tag.View(), search_only}, statement);
     if (!status.Failed()) *out = AsHandle<OCIStmt>(statement);
     return status;
@@ -72,7 +73,7 @@ sword OCIStmtPrepare(OCIStmt* stmt, OCIError* err, const OraText* sql, ub4 sqlLe
 
 sword OCIStmtPrepare2(OCISvcCtx* svc, OCIStmt** stmtOut, OCIError* err, const OraText* sql, ub4 sqlLen,
                       const OraText* key, ub4 keyLen, ub4 language, ub4 mode) {
-    return Enter<ServiceContext>(svc, err, [&](ServiceContext& service) {
+    return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext& service) {
         return Prepare2(service, stmtOut, sql, sqlLen, key, keyLen, language, mode);
     });
 }

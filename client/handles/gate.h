@@ -70,6 +70,17 @@ sword Enter(const void* object, OCIError* errhp, Body&& body) noexcept {
     return EnterWithError<T>(object, errhp, [&](T& target, ErrorHandle&) { return body(target); });
 }
 
+// The same without the object's lock, for bodies that lock what they need themselves, in an order of their own.
+template <class T, class Body>
+sword EnterUnlocked(const void* object, OCIError* errhp, Body&& body) noexcept {
+    const CallInFlight call;
+    ErrorHandle* error = Live<ErrorHandle>(errhp);
+    if (!error) return OCI_INVALID_HANDLE;
+    error->list.Clear();
+    T* target = Live<T>(object);
+    return target ? Guard(error->list, [&] { return body(*target); }) : OCI_INVALID_HANDLE;
+}
+
 // Calls that have nothing but an error handle: body(ErrorHandle&).
 template <class Body>
 sword EnterError(OCIError* errhp, Body&& body) noexcept {

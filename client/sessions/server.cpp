@@ -56,6 +56,9 @@ constexpr AttributeRow kRows[] = {
 
 }  // namespace
 
+Server::Server(const Origin& origin, bool own)
+    : Object(origin), serial_(Env().Threaded() ? std::make_shared<std::recursive_mutex>() : nullptr), own_(own) {}
+
 Server::~Server() { DropSessions(); }
 
 std::span<const AttributeRow> Server::Attributes() const { return kRows; }
@@ -67,9 +70,11 @@ std::shared_ptr<engine::Database> Server::AttachedDatabase() const {
     return database_;
 }
 
-void Server::Join(Session& session, const std::shared_ptr<Link>& link) {
+bool Server::Join(Session& session, const std::shared_ptr<Link>& link, const engine::Database& database) {
     const std::lock_guard lock(mutex_);
+    if (database_.get() != &database) return false;
     sessions_.push_back({&session, link});
+    return true;
 }
 
 void Server::Leave(const Session& session) noexcept {
@@ -85,26 +90,28 @@ std::vector<std::shared_ptr<Link>> Server::Links() const {
 }
 
 Status Server::Attach(std::string_view database) {
+    const SerialLock turn(serial_);
     if (Attached()) return Error(errors::kAlreadyAttached);
     std::unique_ptr<engine::Database> opened;
     Status status = engine::Open(database, opened);
     if (status.Failed()) return status;
-    std::string name(database);
+    name_ = database;
     std::shared_ptr<engine::Database> shared = std::move(opened);
     const std::lock_guard lock(mutex_);
-    if (database_) return Error(errors::kAlreadyAttached);
-    name_ = std::move(name);
     database_ = std::move(shared);
     return status;
 }
 
+// No session joins any more once the database is taken away.
 Status Server::Detach() {
-    if (!Attached()) return Error(errors::kNotConnected);
+    const SerialLock turn(serial_);
+    std::shared_ptr<engine::Database> detached;
+    {
+        const std::lock_guard lock(mutex_);
+        detached = std::exchange(database_, nullptr);
+    }
+    if (!detached) return Error(errors::kNotConnected);
     DropSessions();
-    std::shared_ptr<engine::Database> detached;    // goes when the lock is given up
-    const std::lock_guard lock(mutex_);
-    detached = std::move(database_);
-    database_.reset();
     name_.clear();
     return {};
 }
@@ -114,15 +121,16 @@ Server::BegunSession Server::LastBegun() const {
     return sessions_.empty() ? BegunSession() : sessions_.back();
 }
 
-bool Server::Joined(const Session& session) const {
+bool Server::Joined(const BegunSession& begun) const {
     const std::lock_guard lock(mutex_);
-    return std::any_of(sessions_.begin(), sessions_.end(),
-                       [&session](const BegunSession& begun) { return begun.session == &session; });
+    return std::any_of(sessions_.begin(), sessions_.end(), [&begun](const BegunSession& joined) {
+        return joined.session == begun.session && joined.link == begun.link;
+    });
 }
 
 void Server::DropSessions() noexcept {
     for (BegunSession begun = LastBegun(); begun.session; begun = LastBegun()) {
         const SerialLock serial(begun.link->Serial());
-        if (Joined(*begun.session)) begun.session->Drop();    // else it is freed, or ended
+        if (Joined(begun)) begun.session->Drop();    // else it is freed, or ended
     }
 }

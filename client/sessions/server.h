@@ -1,5 +1,7 @@
-// Server handles: the database that user sessions are begun on. Sessions of one server may begin and end in several
-// threads.
+// Server handles: the database that user sessions are begun on.
+//
+// Threads: attaching, detaching and the attributes take turns by the server's own serial lock; links' locks come after
+// it, never before. Sessions of one server begin and end in any thread.
 #pragma once
 
 #include <atomic>
@@ -20,13 +22,14 @@ class Session;
 class Server : public Object {
 public:
     static constexpr Kind kKind = Kind::server;
-    explicit Server(const Origin& origin, bool own = false) : Object(origin), own_(own) {}
+    explicit Server(const Origin& origin, bool own = false);
     ~Server() override;
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override { return serial_; }
     [[nodiscard]] bool InUse() const override { return own_ || LastBegun().session; }
 
     [[nodiscard]] bool Attached() const;
-    [[nodiscard]] const std::string& DatabaseName() const { return name_; }    // changes with attaching alone
+    [[nodiscard]] const std::string& DatabaseName() const { return name_; }    // under the serial lock
 
     Status Attach(std::string_view database);
     Status Detach();    // sessions that are still begun are dropped: what they did not commit is rolled back
@@ -34,8 +37,9 @@ public:
     // What is attached; null when nothing is.
     [[nodiscard]] std::shared_ptr<engine::Database> AttachedDatabase() const;
 
-    // Sessions that are begun and not ended, and their links.
-    void Join(Session& session, const std::shared_ptr<Link>& link);
+    // Sessions that are begun and not ended, and their links. A session cannot join when the server is no longer
+    // attached to the database that it has connected to.
+    [[nodiscard]] bool Join(Session& session, const std::shared_ptr<Link>& link, const engine::Database& database);
     void Leave(const Session& session) noexcept;
     [[nodiscard]] std::vector<std::shared_ptr<Link>> Links() const;
 
@@ -54,9 +58,10 @@ private:
 
     void DropSessions() noexcept;
     [[nodiscard]] BegunSession LastBegun() const;
-    [[nodiscard]] bool Joined(const Session& session) const;
+    [[nodiscard]] bool Joined(const BegunSession& begun) const;
 
     std::atomic<bool> non_blocking_{false};
+    const std::shared_ptr<std::recursive_mutex> serial_;    // null in an environment without threads
     const bool own_;    // made by a logon and below its service context
     mutable std::mutex mutex_;    // of what follows; nothing else is locked or called while it is held
     std::shared_ptr<engine::Database> database_;    // null when detached

@@ -44,6 +44,11 @@ Status ToggleNonBlocking(Object& object, const AttributeValue&) {
     return status;
 }
 
+Status SetCacheSize(ServiceContext& service, const AttributeValue& value) {
+    service.statement_cache_size = static_cast<std::uint32_t>(value.integer);
+    return {};
+}
+
 Status GetInCurrentMode(ServiceContext&, AttributeValue& value) {
     value.integer = 1;
     return {};
@@ -54,12 +59,15 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_SERVER, Shape::handle, Get<S, GetServerHandle>, SetHandle<Server, &S::SetServer>},
     {OCI_ATTR_SESSION, Shape::handle, Get<S, GetSessionHandle>, SetHandle<Session, &S::SetSession>},
     {OCI_ATTR_TRANS, Shape::handle, Get<S, GetTransactionHandle>, SetHandle<TransactionHandle, &S::SetTransaction>},
-    {OCI_ATTR_STMTCACHESIZE, Shape::ub4, GetField<&S::statement_cache_size>, SetField<&S::statement_cache_size>},
+    {OCI_ATTR_STMTCACHESIZE, Shape::ub4, GetField<&S::statement_cache_size>, Set<S, SetCacheSize>},
     {OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, Get<S, GetNonBlocking>, ToggleNonBlocking, 0, false},
     {OCI_ATTR_IN_V8_MODE, Shape::ub1, Get<S, GetInCurrentMode>, nullptr},
 };
 
 }  // namespace
+
+ServiceContext::ServiceContext(const Origin& origin)
+    : Object(origin), changing_(Env().Threaded() ? std::make_shared<std::recursive_mutex>() : nullptr) {}
 
 std::span<const AttributeRow> ServiceContext::Attributes() const { return kRows; }
 
@@ -105,11 +113,13 @@ Server& ServiceContext::OwnServer() {
 }
 
 Session& ServiceContext::OwnSession() {
+    const SerialLock changing(changing_);
     if (!own_session_) own_session_ = Create<Session>(*this, OCI_HTYPE_SESSION, 0, true);
     return *own_session_;
 }
 
 Status ServiceContext::LogOn(std::string_view database, const engine::Credentials& credentials) {
+    const SerialLock changing(changing_);
     if (logged_on_) {
         Status ended = LogOff();
         if (ended.Failed()) return ended;
@@ -131,17 +141,24 @@ Status ServiceContext::LogOn(std::string_view database, const engine::Credential
 }
 
 Status ServiceContext::LogOff() {
+    const SerialLock changing(changing_);
+    Session* session = GetSession();
     std::shared_ptr<Link> link;
     Status status = Require(link);
     if (status.Failed()) return status;
-    status = GetSession()->End();
-    if (status.Failed()) return status;
-    if (logged_on_) {
-        logged_on_ = false;
-        statement_cache_size = 0;
-        server_ = nullptr;
-        session_ = nullptr;
-        return own_server_->Detach();
+    status = session ? session->End() : Error(errors::kNotLoggedOn);
+    if (status.Failed() || !logged_on_) return status;
+    statement_cache_size = 0;
+    server_ = nullptr;
+    session_ = nullptr;
+    logged_on_ = false;
+    return own_server_->Detach();
+}
+
+SessionTurn::SessionTurn(ServiceContext& service) {
+    for (status = service.Require(link); status.Ok(); status = service.Require(link)) {
+        lock_.emplace(link->Serial());
+        if (!link->Closed()) return;
+        lock_.reset();    // the session ended while its lock was waited for
     }
-    return status;
 }

@@ -1,11 +1,16 @@
 // Service contexts: a server, a user session and a transaction handle together; statements run on the session's link. A
 // logon makes a server and a session of its own below the context and keeps them for the next logon on the same
 // context.
+//
+// Threads: what the context is put together from is read at any time, from any thread (OCIBreak). Logging on and off
+// takes turns by a lock of the context's own, which comes before any other. What works on the session holds the serial
+// lock of its link (SessionTurn, or the gate).
 #pragma once
 
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -20,7 +25,7 @@ public:
     static constexpr Kind kKind = Kind::service_context;
     static constexpr std::uint32_t kDefaultCacheSize = 20;
 
-    explicit ServiceContext(const Origin& origin) : Object(origin) {}
+    explicit ServiceContext(const Origin& origin);
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
     [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
 
@@ -43,7 +48,7 @@ public:
     // The session that the context is to be used with when the application set none: the context's own.
     Session& OwnSession();
 
-    std::uint32_t statement_cache_size = 0;    // 0: no cache
+    std::atomic<std::uint32_t> statement_cache_size{0};    // 0: no cache
 
 private:
     Server& OwnServer();
@@ -51,7 +56,21 @@ private:
     std::atomic<const void*> server_{nullptr};     // read from any thread
     std::atomic<const void*> session_{nullptr};
     std::atomic<const void*> transaction_{nullptr};
+    std::atomic<bool> logged_on_{false};            // by a logon call: server and session are read-only
+    const std::shared_ptr<std::recursive_mutex> changing_;    // null in an environment without threads; of the next
     Server* own_server_ = nullptr;      // children; InUse keeps the application from freeing them
     Session* own_session_ = nullptr;
-    bool logged_on_ = false;            // by a logon call: server and session are read-only
+};
+
+// The turn on the session that a context is used with, for calls that hold no other: `link` is locked and open, or null,
+// and `status` tells why.
+class SessionTurn {
+public:
+    explicit SessionTurn(ServiceContext& service);
+
+    Status status;
+    std::shared_ptr<Link> link;
+
+private:
+    std::optional<SerialLock> lock_;    // given up before the link
 };

@@ -1,6 +1,7 @@
 // User sessions: begin and end.
 #include "sessions/session.h"
 
+#include <optional>
 #include <utility>
 
 #include "handles/attributes.h"
@@ -11,7 +12,8 @@
 namespace {
 
 Status GetOpenStatements(Session& session, AttributeValue& value) {
-    value.integer = session.Begun() ? session.GetLink()->open_statements : 0;
+    const std::shared_ptr<Link> link = session.ShareLink();
+    value.integer = link ? link->open_statements : 0;
     return {};
 }
 
@@ -45,38 +47,67 @@ std::span<const AttributeRow> Session::Attributes() const { return kRows; }
 
 std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_.Serial(); }
 
+// The link of the moment, locked: null when the session is not begun. The session may have ended, and begun on another
+// link, while the lock was waited for.
+class Session::Turn {
+public:
+    explicit Turn(const Session& session) {
+        for (link = session.ShareLink(); link; link = session.ShareLink()) {
+            lock_.emplace(link->Serial());
+            if (session.ShareLink() == link) return;
+            lock_.reset();
+        }
+    }
+    std::shared_ptr<Link> link;
+
+private:
+    std::optional<SerialLock> lock_;    // given up before the link
+};
+
 Status Session::Begin(Server& server, const engine::Credentials& credentials) {
-    if (Begun()) return Error(errors::kAlreadyAuthenticated);
+    if (beginning_.exchange(true)) return Error(errors::kAlreadyAuthenticated);
+    struct Done {
+        std::atomic<bool>& beginning;
+        ~Done() { beginning = false; }
+    } const done{beginning_};
+    return ShareLink() ? Error(errors::kAlreadyAuthenticated) : Connect(server, credentials);
+}
+
+Status Session::Connect(Server& server, const engine::Credentials& credentials) {
     std::shared_ptr<engine::Database> database = server.AttachedDatabase();
     if (!database) return Error(errors::kNotConnected);
     auto stop = std::make_shared<engine::StopRequest>();
     std::unique_ptr<engine::Connection> connection;
     Status status = database->Connect(credentials, stop, connection);
     if (status.Failed()) return status;
-    auto link =
-        std::make_shared<Link>(std::move(database), std::move(connection), std::move(stop), Env().Threaded());
+    auto link = std::make_shared<Link>(database, std::move(connection), std::move(stop), Env().Threaded());
     if (!credentials.external) link->user = credentials.user;
     const SerialLock serial(link->Serial());
-    server.Join(*this, link);
+    if (!server.Join(*this, link, *database)) return Error(errors::kNotConnected);
     server_ = &server;
     link_.Set(std::move(link));
-    return {};
+    return status;
 }
 
 Status Session::End() {
-    const SerialLock serial(link_.Serial());    // the caller may hold that of another session
-    if (!Begun()) return Error(errors::kNotLoggedOn);
-    Status status = GetLink()->Engine().Commit();
+    const Turn turn(*this);
+    if (!turn.link) return Error(errors::kNotLoggedOn);
+    Status status = turn.link->Engine().Commit();
     if (!status.Failed()) Drop();
     return status;
 }
 
+Status Session::ChangePassword(const std::string& user_name, const std::string& old_password,
+                               const std::string& new_password) {
+    const Turn turn(*this);
+    if (!turn.link) return Error(errors::kNotLoggedOn);
+    return turn.link->Engine().ChangePassword(user_name, old_password, new_password);
+}
+
 void Session::Drop() noexcept {
-    const SerialLock serial(link_.Serial());
-    const std::shared_ptr<Link> link = link_.Get();
-    if (!link) return;
-    link->Close();
-    Server* server = std::exchange(server_, nullptr);
-    server->Leave(*this);
+    const Turn turn(*this);
+    if (!turn.link) return;
+    turn.link->Close();
+    std::exchange(server_, nullptr)->Leave(*this);
     link_.Set(nullptr);    // last: who frees the session waits for the lock as long as it has a link
 }

@@ -1,7 +1,11 @@
 // User sessions: who is logged on, and the link that the session's work runs on. Session handles also carry the names
 // and passwords for pools (they are authentication handles).
+//
+// Threads: a session that is begun is used under the serial lock of its link, which Begin, End and Drop take themselves;
+// of several threads that begin one session, one does. No thread holds the locks of two links that it waits for.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -28,6 +32,9 @@ public:
 
     Status Begin(Server& server, const engine::Credentials& credentials);
     Status End();             // commits; an error leaves the session as it was
+    // On the session's own connection: error 1012 when it is not begun.
+    Status ChangePassword(const std::string& user_name, const std::string& old_password,
+                          const std::string& new_password);
     void Drop() noexcept;     // rolls back; nothing when not begun
 
     std::string user;
@@ -43,7 +50,11 @@ public:
     std::uint32_t purity = 0;
 
 private:
+    Status Connect(Server& server, const engine::Credentials& credentials);
+    class Turn;
+
     const bool own_;
+    std::atomic<bool> beginning_{false};    // some thread is at it
     LinkShare link_;
     Server* server_ = nullptr;    // while begun
 };
