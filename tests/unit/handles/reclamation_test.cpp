@@ -381,4 +381,41 @@ TEST(Storm, HandlesMadeUsedAndFreedByAllThreads) {
     EXPECT_EQ(OCI_memGetMemCount(), before);
 }
 
+// A bind of the application's own, asked by one thread while another frees its statement.
+TEST(Storm, BindHandleAskedWhileItsStatementIsFreed) {
+    OCIEnv* env = nullptr;
+    ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+    const auto make = [env](ub4 type) {
+        dvoid* made = nullptr;
+        EXPECT_EQ(OCIHandleAlloc(env, &made, type, 0, nullptr), OCI_SUCCESS);
+        return made;
+    };
+    auto* err = static_cast<OCIError*>(make(OCI_HTYPE_ERROR));
+    auto* ask_err = static_cast<OCIError*>(make(OCI_HTYPE_ERROR));
+    auto* bind = static_cast<OCIBind*>(make(OCI_HTYPE_BIND));
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(":memory:"), 8), OCI_SUCCESS);
+    std::atomic<bool> stop{false};
+    std::thread asking([&, own = bind] {
+        while (!stop) {
+            OCIEnv* answer = nullptr;
+            EXPECT_EQ(OCIAttrGet(own, OCI_HTYPE_BIND, &answer, nullptr, OCI_ATTR_ENV, ask_err), OCI_SUCCESS);
+            EXPECT_EQ(answer, env);
+        }
+    });
+    sb4 value = 1;
+    const auto end = std::chrono::steady_clock::now() + 1s;
+    while (std::chrono::steady_clock::now() < end) {
+        auto* stmt = static_cast<OCIStmt*>(make(OCI_HTYPE_STMT));
+        ASSERT_EQ(OCIStmtPrepare(stmt, err, Text("select :v from dual"), 19, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIBindByPos(stmt, &bind, err, 1, &value, sizeof value, SQLT_INT, nullptr, nullptr, nullptr, 0,
+                               nullptr, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIStmtExecute(svc, stmt, err, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
+        ASSERT_EQ(OCIHandleFree(stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
+    }
+    stop = true;
+    asking.join();
+    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
 }  // namespace
