@@ -35,7 +35,6 @@ Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 
     if (!text.Valid() || !tag.Valid()) return Error(errors::kBadText);
     Statement* statement = nullptr;
     const bool search_only = mode & OCI_PREP2_CACHE_SEARCHONLY;
-    const SessionTurn turn(service);
     Status status = PrepareThroughCache(service, {text.View(), tag.View(), search_only}, statement);
     if (!status.Failed()) *out = AsHandle<OCIStmt>(statement);
     return status;

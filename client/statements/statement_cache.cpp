@@ -70,8 +70,9 @@ void StatementCache::Forget(const Statement& statement) noexcept { std::erase(ke
 
 Status PrepareThroughCache(ServiceContext& service, const PrepareRequest& request, Statement*& statement) {
     if (request.text.empty() && request.key.empty()) return Error(errors::kNoTextOrKey);
-    std::shared_ptr<Link> link;
-    if (Status status = service.Require(link); !status.Ok()) return status;
+    const SessionTurn turn(service);
+    if (!turn.status.Ok()) return turn.status;
+    const std::shared_ptr<Link>& link = turn.link;
     StatementCache* cache = CacheOf(service, *link);
     statement = cache && !request.key.empty() ? cache->TakeByKey(request.key) : nullptr;
     if (statement) return {};

@@ -206,7 +206,7 @@ protected:
     // Makes and frees statements while `wait` runs in another thread, which `end` makes return; the wait is given time
     // to begin.
     void MakeAndFree(const std::function<void()>& wait, const std::function<void()>& end) {
-        constexpr int kOld = 100, kRounds = 100'000;
+        constexpr int kOld = 100, kRounds = 30'000;
         std::vector<dvoid*> old(kOld);
         for (dvoid*& handle : old) ASSERT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 8, nullptr), OCI_SUCCESS);
         const sb4 before = OCI_memGetMemCount();
