@@ -59,6 +59,8 @@ TEST_F(Loader, OthersStandInForWhatOnlyOursHas) {
     EXPECT_EQ(Call(&ClientLibrary::OCIDateTimeCheckNS, nullptr, nullptr, nullptr, nullptr), OCI_SUCCESS);
     EXPECT_EQ(client_library.OCIDateTimeCheckNS.pointer, client_library.OCIDateTimeCheck.pointer);
     EXPECT_EQ(Call(&ClientLibrary::OCI_memGetMemCount), 0);
+    EXPECT_FALSE(Exports(&ClientLibrary::XaGetInfo));
+    EXPECT_EQ(client_library.XaGetInfo.missing, Missing::answers_error);
     EXPECT_EQ(complaints, "");
 }
 
