@@ -1,6 +1,6 @@
 // The commands: their words and codes, and how a code reaches its handler. What a command looks like (code, word
 // counts, usage text, and whatever tells it from its siblings) is a row; rows of one shape share one handler. All of it
-// is set up at start-up and only read afterwards.
+// is set up at start-up and only read afterwards, in any thread.
 #pragma once
 
 #include <algorithm>

@@ -1,4 +1,4 @@
-// Dates and datetimes, as elements and by themselves.
+// Dates and datetimes, as elements and by themselves. Command thread only.
 #include "core/state.h"
 #include "objects/displays.h"
 #include "objects/element_access.h"

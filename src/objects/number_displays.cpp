@@ -1,4 +1,4 @@
-// Numbers: the library's, the machine's, packed decimals, decimal floats.
+// Numbers: the library's, the machine's, packed decimals, decimal floats. Command thread only.
 #include <algorithm>
 #include <string>
 

@@ -1,4 +1,4 @@
-// Texts between quotes and bytes as pairs of digits, however an element tells how long they are.
+// Texts between quotes and bytes as pairs of digits, however an element tells how long they are. Command thread only.
 #include <algorithm>
 #include <cstring>
 #include <string_view>

@@ -316,7 +316,8 @@ constexpr PlainCommand kDynamicCommands[] = {
      GetPieceInfo},
     {{Code::ocistmtsetpieceinfo, Words(6, 7),
       "OCIStmtSetPieceInfo hHandle {oci_htype_bind | oci_htype_define} hError "
-      "{OCI_FIRST_PIECE | OCI_NEXT_PIECE | OCI_LAST_PIECE | OCI_ONE_PIECE } {memhandle | memstructhandle elementindex}"},
+      "{OCI_FIRST_PIECE | OCI_NEXT_PIECE | OCI_LAST_PIECE | OCI_ONE_PIECE } "
+      "{memhandle | memstructhandle elementindex}"},
      SetPieceInfo},
 };
 
