@@ -7,17 +7,21 @@
 namespace faults {
 namespace {
 
-void CreateEnvironment(World& w, ub4 mode = OCI_DEFAULT) {
-    w.Step("OCIEnvCreate", [&] {
-        return OCIEnvCreate(&w.env, mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 16,
-                            nullptr);
-    }, Told::code);
+void OwnEnvironment(World& w) {
     w.AtEnd([&w] {
         OCIEnv* const env = std::exchange(w.env, nullptr);
         w.err = nullptr;
         return OCIHandleFree(env, OCI_HTYPE_ENV);
     });
     w.err = w.New<OCIError>(OCI_HTYPE_ERROR);
+}
+
+void CreateEnvironment(World& w) {
+    w.Step("OCIEnvCreate", [&] {
+        return OCIEnvCreate(&w.env, w.mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release,
+                            16, nullptr);
+    }, Told::code);
+    OwnEnvironment(w);
 }
 
 void LogOn(World& w, std::string_view user, std::string_view password, std::string_view database) {
@@ -39,6 +43,23 @@ void FromNothing(World& w) {
     w.Define(1, {text, 4, SQLT_STR});
     w.Execute(1);
     w.See(text);
+}
+
+// The older way in, and a logon that brings the statement cache along.
+void InitializeAndLogOn2(World& w) {
+    w.Step("OCIInitialize", [&] {
+        return OCIInitialize(w.mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release);
+    }, Told::code);
+    w.AtEnd([] { return OCITerminate(OCI_DEFAULT); });
+    w.Step("OCIEnvInit", [&] { return OCIEnvInit(&w.env, OCI_DEFAULT, 16, nullptr); }, Told::code);
+    OwnEnvironment(w);
+    w.Step("OCILogon2", [&] {
+        return OCILogon2(w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8, OCI_LOGON2_STMTCACHE);
+    });
+    w.AtEnd([&w] { return OCILogoff(std::exchange(w.svc, nullptr), w.err); });
+    w.Step("OCIBreak", [&] { return OCIBreak(w.svc, w.err); });
+    w.Step("OCIReset", [&] { return OCIReset(w.svc, w.err); });
+    w.See(w.Attribute<ub4>(OCI_ATTR_STMTCACHESIZE, w.svc, OCI_HTYPE_SVCCTX));
 }
 
 // Frees nothing but what was made undisturbed: an end takes no memory, even as a thread's first call.
@@ -152,6 +173,53 @@ void FirstLogon(World& w) {
     w.See(w.Number(w.err, OCI_HTYPE_ERROR));
 }
 
+void MustRun(World& w, OCISvcCtx* svc, OCIStmt* stmt, std::string_view sql) {
+    EXPECT_EQ(OCIStmtPrepare(stmt, w.err, World::Text(sql), World::Size(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+    EXPECT_EQ(OCIStmtExecute(svc, stmt, w.err, 1, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS) << sql;
+}
+
+// The end of a session commits what is open, queries or not.
+void LogoffCommits(World& w) {
+    const std::string database = w.Folder() + "/logoff.db";
+    const auto log_on = [&] {
+        OCISvcCtx* svc = nullptr;
+        EXPECT_EQ(OCILogon(w.env, w.err, &svc, nullptr, 0, nullptr, 0, World::Text(database), World::Size(database)),
+                  OCI_SUCCESS);
+        return svc;
+    };
+    dvoid *changing = nullptr, *reading = nullptr;
+    OCIHandleAlloc(w.env, &changing, OCI_HTYPE_STMT, 0, nullptr);
+    OCIHandleAlloc(w.env, &reading, OCI_HTYPE_STMT, 0, nullptr);
+    w.AtEnd([changing] { return OCIHandleFree(changing, OCI_HTYPE_STMT); });
+    w.AtEnd([reading] { return OCIHandleFree(reading, OCI_HTYPE_STMT); });
+    auto* const change = static_cast<OCIStmt*>(changing);
+    OCISvcCtx* svc = log_on();
+    MustRun(w, svc, change, "create table if not exists t(a number)");
+    MustRun(w, svc, change, "delete from t");
+    MustRun(w, svc, change, "commit");
+    MustRun(w, svc, change, "insert into t values(1)");
+    sb4 number = 0;
+    OCIDefine* define = nullptr;
+    OCIStmtPrepare(static_cast<OCIStmt*>(reading), w.err, World::Text("select a from t"), 15, OCI_NTV_SYNTAX, 0);
+    OCIDefineByPos(static_cast<OCIStmt*>(reading), &define, w.err, 1, &number, 4, SQLT_INT, nullptr, nullptr, nullptr, 0);
+    OCIStmtExecute(svc, static_cast<OCIStmt*>(reading), w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT);
+    bool failed = false;
+    try {
+        w.Step("OCILogoff", [&] { return OCILogoff(svc, w.err); });
+    } catch (const Stopped&) {
+        failed = true;
+        EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS) << "again";
+    }
+    svc = log_on();
+    MustRun(w, svc, change, "delete from t");
+    ub4 rows = 0;
+    OCIAttrGet(change, OCI_HTYPE_STMT, &rows, nullptr, OCI_ATTR_ROW_COUNT, w.err);
+    EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS);
+    EXPECT_EQ(rows, 1u) << (failed ? "after a logoff that failed" : "after a logoff");
+    if (failed) throw Stopped();
+    w.See(static_cast<long>(rows));
+}
+
 // What is told of an error takes memory, too; without it there is the return code, and the record stays.
 void ErrorTexts(World& w) {
     OCIStmtPrepare(w.stmt, w.err, World::Text("select * from missing"), 21, OCI_NTV_SYNTAX, OCI_DEFAULT);
@@ -175,11 +243,14 @@ void ErrorTexts(World& w) {
 
 constexpr Scenario kScenarios[] = {
     {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;"},
+    {"FromNothingThreaded", Ground::nothing, nullptr, FromNothing, "abc;", OCI_THREADED | OCI_OBJECT},
+    {"InitializeAndLogOn2", Ground::nothing, nullptr, InitializeAndLogOn2, "20;"},
     {"FreeingTakesNoMemory", Ground::nothing, nullptr, FreeingTakesNoMemory, "freed;"},
     {"HandlesAndDescriptors", Ground::environment, nullptr, HandlesAndDescriptors, "made;"},
     {"AttachAndBegin", Ground::environment, nullptr, AttachAndBegin, "36;version;", OCI_UTF16},
     {"FirstLogon", Ground::environment, nullptr, FirstLogon, "1017;"},
     {"PasswordChange", Ground::environment, Account, PasswordChange, "changed;"},
+    {"LogoffCommits", Ground::environment, nullptr, LogoffCommits, "1;"},
     {"ErrorTexts", Ground::session, nullptr, ErrorTexts, "942;named;"},
 };
 

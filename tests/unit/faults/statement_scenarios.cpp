@@ -68,6 +68,34 @@ void ArrayInsert(World& w) {
     w.See(Rows(w));
 }
 
+void ArrayOfStructures(World& w) {
+    EarlierRow(w);
+    struct Row {
+        sb8 number;
+        char text[40];
+        sb2 indicator;
+    } rows[3] = {{1, "a text too long for a short string", 0}, {2, "two", 0}, {3, "", -1}}, back[4] = {};
+    w.Prepare("insert into t(a, b) values(:1, :2)");
+    OCIBind* const binds[] = {w.Bind(1, {&rows[0].number, 8, SQLT_INT}),
+                              w.Bind(2, {rows[0].text, 40, SQLT_STR, &rows[0].indicator})};
+    for (OCIBind* bind : binds) {
+        w.Step("OCIBindArrayOfStruct", [&] {
+            return OCIBindArrayOfStruct(bind, w.err, sizeof(Row), sizeof(Row), 0, 0);
+        });
+    }
+    ExecuteArray(w, 3);
+    w.Prepare("select a, b from t order by a");
+    OCIDefine* const defines[] = {w.Define(1, {&back[0].number, 8, SQLT_INT}),
+                                  w.Define(2, {back[0].text, 40, SQLT_STR, &back[0].indicator})};
+    for (OCIDefine* define : defines) {
+        w.Step("OCIDefineArrayOfStruct", [&] {
+            return OCIDefineArrayOfStruct(define, w.err, sizeof(Row), sizeof(Row), 0, 0);
+        });
+    }
+    w.Execute(4);
+    for (const Row& row : back) w.See(row.indicator == -1 ? "-" : row.text);
+}
+
 // Rows 1 and 3 are refused: each gets a record of its own. So does one that finds no memory; where none is left for
 // records, the call fails. Every row is accounted for.
 void BatchErrors(World& w) {
@@ -245,6 +273,33 @@ void BlockWithCursor(World& w) {
     w.See(number);
 }
 
+// The descriptor becomes a statement.
+void BlockWithResultSet(World& w) {
+    static dvoid* result;
+    static ub4 type;
+    result = nullptr;
+    type = OCI_DTYPE_RSET;
+    w.Step("OCIDescriptorAlloc", [&] { return OCIDescriptorAlloc(w.env, &result, OCI_DTYPE_RSET, 0, nullptr); },
+           Told::environment);
+    w.AtEnd([] { return type == OCI_DTYPE_RSET ? OCIDescriptorFree(result, type) : OCIHandleFree(result, type); });
+    w.Prepare("begin open :c for select 'a value that is not short at all' from dual; end;");
+    w.Bind(1, {&result, 8, SQLT_RSET});
+    w.Execute();
+    w.Step("OCIResultSetToStmt", [&] { return OCIResultSetToStmt(static_cast<OCIResult*>(result), w.err); });
+    type = OCI_HTYPE_STMT;
+    OCIStmt* const block = std::exchange(w.stmt, static_cast<OCIStmt*>(result));
+    char text[40] = "";
+    try {
+        w.Define(1, {text, 40, SQLT_STR});
+        w.Fetch();
+    } catch (const Stopped&) {
+        w.stmt = block;
+        throw;
+    }
+    w.stmt = block;
+    w.See(text);
+}
+
 void IndexTables(World& w) {
     sb4 numbers[5] = {1, 2, 3, 4, 5};
     char texts[5][40] = {};
@@ -377,6 +432,8 @@ void DescribedColumns(World& w) {
 constexpr Scenario kScenarios[] = {
     {"ArrayInsert", Ground::session, Table, ArrayInsert,
      "5;0earlier,10aa,20a text too long for a short string,30-,40-,50ee;"},
+    {"ArrayOfStructures", Ground::session, Table, ArrayOfStructures,
+     "earlier;a text too long for a short string;two;-;"},
     {"BatchErrors", Ground::session, Table, BatchErrors, "2;1;1;1;3;0earlier,10aa,30-,50ee;"},
     {"Returning", Ground::session, Table, Returning,
      "naa;na text too long for a short string;;0earlier,10naa,20na text too long for a short string,30-;"},
@@ -389,6 +446,7 @@ constexpr Scenario kScenarios[] = {
     {"Definition", Ground::session, Table, Definition, "0;1;"},
     {"Block", Ground::session, Table, Block, "6;0earlier,1-,2-,3-;"},
     {"BlockWithCursor", Ground::session, Table, BlockWithCursor, "a value that is not short at all;77;"},
+    {"BlockWithResultSet", Ground::session, nullptr, BlockWithResultSet, "a value that is not short at all;"},
     {"IndexTables", Ground::session, Table, IndexTables, "5;number of the index table 5;"},
     {"BlockThatUndoesItself", Ground::session, Table, BlockThatUndoesItself, "0earlier;"},
     {"PiecesIn", Ground::session, Table, PiecesIn, "0earlier,1first and a longer one to follow it and last,2alone;"},

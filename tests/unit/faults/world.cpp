@@ -15,9 +15,9 @@ void Must(sword code, const char* what) {
 
 }  // namespace
 
-World::World(Ground ground, ub4 mode) : ground_(ground), utf16_(mode & OCI_UTF16) {
+World::World(Ground ground, ub4 wanted) : mode(wanted), ground_(ground) {
     ++made_;
-    if (ground_ != Ground::nothing) OpenEnvironment(mode);
+    if (ground_ != Ground::nothing) OpenEnvironment();
     if (ground_ == Ground::session) OpenSession();
 }
 
@@ -27,7 +27,7 @@ World::~World() {
     if (!folder_.empty()) std::filesystem::remove_all(folder_);
 }
 
-void World::OpenEnvironment(ub4 mode) {
+void World::OpenEnvironment() {
     Must(OCIEnvCreate(&env, mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 0,
                       nullptr), "OCIEnvCreate");
     Must(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr), "OCIHandleAlloc");
@@ -95,7 +95,7 @@ void World::Run(std::string_view sql) {
 
 // A text of ASCII in the form of the environment.
 std::string World::Encoded(std::string_view text) const {
-    if (!utf16_) return std::string(text);
+    if (!(mode & OCI_UTF16)) return std::string(text);
     std::string units;
     for (const char c : text) units.append({c, '\0'});
     return units;

@@ -132,6 +132,7 @@ public:
     }
     static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
 
+    const ub4 mode;    // of the environment
     OCIEnv* env = nullptr;
     OCIError* err = nullptr;
     OCISvcCtx* svc = nullptr;
@@ -144,7 +145,7 @@ private:
         const Armed armed;
         return call();
     }
-    void OpenEnvironment(ub4 mode);
+    void OpenEnvironment();
     void OpenSession();
     void CheckFailure(std::string_view name, Told told, sb4 also);
 
@@ -153,7 +154,6 @@ private:
     std::string Encoded(std::string_view text) const;
 
     Ground ground_;
-    bool utf16_;
     OCIError* quiet_err_ = nullptr;
     OCIStmt* quiet_ = nullptr;
     std::vector<std::function<sword()>> ends_;
