@@ -1,0 +1,246 @@
+// The rows of a query: stepping, reading values, scrolling, reading ahead. Nothing is allocated for a row that is
+// delivered.
+#include <algorithm>
+#include <limits>
+#include <new>
+
+#include "engine/sqlite/characters.h"
+#include "engine/sqlite/query.h"
+#include "engine/sqlite/query_parts.h"
+#include "engine/sqlite/row_number.h"
+#include "engine/sqlite/stored_number.h"
+
+namespace engine::sqlite {
+
+// Binds and makes the first step, which a later row's views must not depend on: values are copied.
+Status SqliteQuery::Start(RowSource& source, std::uint32_t row, bool& has_row) {
+    Status status = BindRow(source, row, true);
+    if (status.Ok()) status = Step(has_row);
+    if (status.Ok() && has_row) DescribeFromRow();
+    else if (status.Ok()) Columns();
+    return status;
+}
+
+Status SqliteQuery::Open(RowSource& source, const QueryRun& run) {
+    Close();
+    if (connection_.Stopping()) return SqliteConnection::Stopped();
+    Running running(connection_, statement_.get());
+    Status status = connection_.Enter(entry_, this, running.began);
+    bool has_row = false;
+    if (status.Ok()) status = Start(source, run.row, has_row);
+    if (!status.Ok()) return status;
+    scrollable_ = run.scrollable;
+    running.began = false;
+    if (!has_row) {
+        state_ = State::drained;
+        return status;
+    }
+    running.GoesOn();
+    state_ = State::on_row;
+    connection_.Join(*this);
+    return status;
+}
+
+Status SqliteQuery::CheckOpen() {
+    if (state_ == State::closed) return Error(errors::kFetchOutOfSequence);
+    return connection_.Stopping() ? Ended(SqliteConnection::Stopped()) : Status();
+}
+
+Status SqliteQuery::Ended(Status status) noexcept {
+    Close();
+    return status;
+}
+
+Status SqliteQuery::Fetch(RowSink& sink, std::uint32_t most, bool& more) {
+    more = false;
+    Status status = CheckOpen();
+    for (std::uint32_t row = 0; row < most && status.Ok(); ++row) {
+        bool found = false;
+        status = Next(found);
+        if (!status.Ok()) return Ended(std::move(status));
+        if (!found) {
+            if (!scrollable_) Close();
+            return status;
+        }
+        status = sink.Row(0, values_);
+    }
+    more = IsOpen();
+    return status;
+}
+
+// The next row as views, wherever it comes from.
+Status SqliteQuery::Next(bool& found) {
+    if (scrollable_ && next_ == store_.Size()) {
+        if (Status status = Keep(next_ + 1); !status.Ok()) return status;
+    }
+    if (scrollable_ || state_ == State::drained) {
+        found = next_ < store_.Size();
+        Status status = found ? store_.Read(next_, values_) : end_;
+        if (found && status.Ok()) ++next_;
+        return status;
+    }
+    if (state_ == State::stepping) {
+        bool has_row = false;
+        Status status = Step(has_row);
+        if (!has_row) return status;
+        state_ = State::on_row;
+    }
+    Fill();
+    state_ = State::stepping;
+    found = true;
+    return {};
+}
+
+// Steps to the next row and copies it into the store; drained behind the last one.
+Status SqliteQuery::KeepRow() {
+    if (state_ == State::stepping) {
+        bool has_row = false;
+        Status status = Step(has_row);
+        if (!has_row) {
+            if (status.Ok()) Drain({});
+            return status;
+        }
+        state_ = State::on_row;
+    }
+    Fill();
+    Status status = store_.Add(values_);
+    if (status.Ok()) state_ = State::stepping;
+    return status;
+}
+
+// Reads on until the store has that many rows, or all.
+Status SqliteQuery::Keep(std::uint64_t rows) {
+    Status status;
+    while (status.Ok() && store_.Size() < rows && state_ != State::drained) status = KeepRow();
+    return status.Ok() && store_.Size() < rows ? end_ : status;
+}
+
+void SqliteQuery::Drain(Status end) noexcept {
+    sqlite3_reset(statement_.get());
+    connection_.Leave(*this);
+    end_ = std::move(end);
+    state_ = State::drained;
+}
+
+Status SqliteQuery::ReadAhead() noexcept {
+    Status status;
+    try {
+        while (status.Ok() && state_ != State::drained) status = KeepRow();
+    } catch (const std::bad_alloc&) {
+        status = NoMemory();
+    }
+    if (state_ != State::drained) Drain(std::move(status));
+    return end_;
+}
+
+Status SqliteQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
+    found = false;
+    Status status = CheckOpen();
+    if (!status.Ok()) return status;
+    if (!scrollable_) return Error(errors::kFetchOutOfSequence);
+    status = Keep(position);
+    if (!status.Ok()) return Ended(std::move(status));
+    next_ = std::min(position, store_.Size());
+    if (position == 0 || position > store_.Size()) return status;
+    status = store_.Read(position - 1, values_);
+    if (!status.Ok()) return Ended(std::move(status));
+    found = true;
+    return sink.Row(0, values_);
+}
+
+Status SqliteQuery::Count(std::uint64_t& rows) {
+    Status status = CheckOpen();
+    if (!status.Ok()) return status;
+    if (!scrollable_) return Error(errors::kFetchOutOfSequence);
+    status = Keep(std::numeric_limits<std::uint64_t>::max());
+    if (!status.Ok()) return Ended(std::move(status));
+    rows = store_.Size();
+    return status;
+}
+
+void SqliteQuery::Close() noexcept {
+    if (state_ == State::closed) return;
+    if (state_ != State::drained) Drain({});
+    sqlite3_clear_bindings(statement_.get());
+    store_.Clear();
+    state_ = State::closed;
+    end_ = {};
+    next_ = 0;
+}
+
+// ---- Reading
+
+// The row that SQLite stands on, as views. Throws where SQLite found no memory for a value.
+void SqliteQuery::Fill() {
+    sqlite3_stmt* const statement = statement_.get();
+    const bool utf8 = connection_.Utf8();
+    const Reading* reading = readings_.data();
+    const int count = static_cast<int>(values_.size());
+    Datum* value = values_.data();
+    for (int index = 0; index < count; ++index, ++value, ++reading) {
+        sqlite3_value* const stored = sqlite3_column_value(statement, index);
+        switch (sqlite3_value_type(stored)) {
+            case SQLITE_INTEGER:
+                value->kind = Kind::integer;
+                value->length = 0;
+                value->integer = sqlite3_value_int64(stored);
+                if (*reading == Reading::row_id) FillRowId(index, *value);
+                break;
+            case SQLITE_FLOAT:
+                value->kind = Kind::real;
+                value->length = 0;
+                value->real = sqlite3_value_double(stored);
+                break;
+            case SQLITE_TEXT:
+                value->kind = Kind::text;
+                // The bytes as they lie in the file: asking for a text would copy them to add a zero.
+                value->data = utf8 ? sqlite3_value_blob(stored) : sqlite3_value_text(stored);
+                value->length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
+                if (!value->data && (value->length > 0 || !utf8)) throw std::bad_alloc();
+                if (*reading == Reading::date) FillDate(index, *value);
+                if (*reading == Reading::padded) Pad(index, *value);
+                break;
+            case SQLITE_BLOB:
+                value->kind = Kind::bytes;
+                value->data = sqlite3_value_blob(stored);
+                value->length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
+                if (!value->data && value->length > 0) throw std::bad_alloc();
+                if (*reading != Reading::bytes) FillNumber(index, *value);
+                break;
+            default: *value = {}; break;
+        }
+    }
+}
+
+void SqliteQuery::FillRowId(int column, Datum& value) {
+    RowId& row = rooms_[static_cast<std::size_t>(column)].row;
+    row = RowIdOf(value.integer);
+    SetView(value, Kind::row_id, &row, sizeof row);
+}
+
+// A text that is no date stays one, and so does a time alone.
+void SqliteQuery::FillDate(int column, Datum& value) {
+    date::DateTime& date = rooms_[static_cast<std::size_t>(column)].date;
+    if (date::FromEngineText(value.Text(), &date) != 0 || date.month == 0) return;
+    SetView(value, Kind::timestamp, &date, sizeof date);
+}
+
+void SqliteQuery::FillNumber(int column, Datum& value) {
+    OCINumber& number = rooms_[static_cast<std::size_t>(column)].number;
+    if (ReadNumberBlob(value.Text(), number)) SetView(value, Kind::decimal, &number, sizeof number);
+}
+
+// A fixed column's texts have its length, in characters or bytes.
+void SqliteQuery::Pad(int index, Datum& value) {
+    const auto column = static_cast<std::size_t>(index);
+    const std::size_t characters = columns_[column].characters;
+    const std::size_t more = characters > 0 ? value.length - static_cast<std::size_t>(CharacterCount(value.Text())) : 0;
+    const std::size_t size = (characters > 0 ? characters : columns_[column].size) + more;
+    if (value.length >= size) return;
+    std::string& padded = rooms_[column].padded;
+    padded.assign(value.Text());
+    padded.resize(size, ' ');
+    SetView(value, Kind::text, padded.data(), size);
+}
+
+}  // namespace engine::sqlite
