@@ -498,11 +498,17 @@ TEST_P(Contract, WhatEndsOrUndoesLooksAtNoRequest) {
     MakeNumbers(1);
     ASSERT_EQ(Answer(connection_->SetMark()), 0);
     ASSERT_EQ(Run("insert into t values(2)"), 0);
+    const char* many = "with recursive r(n) as (select 1 union all select n + 1 from r where n < 20000) "
+                       "select r.n, t.n from r, t where r.n > 19999 order by t.n";
+    const auto undone = Opened(many);
+    const auto rolled_back = Opened(many);
     stop_->Ask();
     EXPECT_EQ(Answer(connection_->UndoToMark()), 0);
     EXPECT_EQ(Answer(connection_->DropMark()), 0);
     EXPECT_EQ(Answer(connection_->Rollback()), 0);
     EXPECT_TRUE(stop_->Take());
+    EXPECT_EQ(Rest(*undone), "20000,1;20000,2;") << "rows that an undo must keep for a query are read whole";
+    EXPECT_EQ(Rest(*rolled_back), "20000,1;20000,2;");
     ASSERT_EQ(Run("insert into t values(3)"), 0);
     stop_->Ask();
     EXPECT_EQ(Answer(connection_->Commit()), 0);
