@@ -30,6 +30,15 @@ protected:
         ASSERT_EQ(Answer(connection_->Commit()), 0);
     }
     std::string All() { return Query("select n from t order by n"); }
+    // Rows of one character each, in order.
+    static std::string Sorted(const std::string& rows) {
+        std::set<std::string> parts;
+        for (std::size_t begin = 0, end; (end = rows.find(';', begin)) != std::string::npos; begin = end + 1)
+            parts.insert(rows.substr(begin, end + 1 - begin));
+        std::string sorted;
+        for (const std::string& part : parts) sorted += part;
+        return sorted.size() == rows.size() ? sorted : "not once each: " + rows;
+    }
     std::string Count() { return Query("select count(*) from t"); }
 };
 
@@ -360,12 +369,13 @@ TEST_P(Contract, OpenQueryDeliversTheRowsThatThereWereWhenItWasOpened) {
             ASSERT_EQ(Run("savepoint here"), 0);
             ASSERT_EQ(Answer(connection_->SetMark()), 0);
             ASSERT_EQ(Run("insert into t select 1 union all select 2 union all select 3"), 0);
-            const auto first = Opened("select n from t order by n", {.scrollable = scrollable});
-            const auto unread = Opened("select n from t order by n", {.scrollable = scrollable});
-            ASSERT_EQ(Fetched(*first, 1), "1;");
+            // Without an order, lest the engine sort, and thereby keep, the rows beforehand.
+            const auto first = Opened("select n from t", {.scrollable = scrollable});
+            const auto unread = Opened("select n from t", {.scrollable = scrollable});
+            const std::string head = Fetched(*first, 1);
             c.happens();
-            EXPECT_EQ(Rest(*first), "2;3;") << c.what;
-            EXPECT_EQ(Rest(*unread), "1;2;3;") << c.what;
+            EXPECT_EQ(Sorted(head + Rest(*first)), "1;2;3;") << c.what;
+            EXPECT_EQ(Sorted(Rest(*unread)), "1;2;3;") << c.what;
             first->Close();
             unread->Close();
             ASSERT_EQ(Answer(connection_->Rollback()), 0);
