@@ -1,5 +1,5 @@
 // Binds and defines.
-#include "entry/text_argument.h"
+#include "entry/call_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "statements/statement.h"
@@ -11,7 +11,7 @@ Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4
     if (!name) return Error(errors::kNoSuchBind);
     // A length below 0 asks to measure the name.
     const std::size_t measured = length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length);
-    const TextArgument text(statement.Env(), name, measured, false);
+    const CallText text(statement.Env(), name, measured, false);
     return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(errors::kBadText);
 }
 

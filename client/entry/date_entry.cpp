@@ -4,7 +4,7 @@
 #include "date/date.h"
 #include "date/format.h"
 #include "date/zone.h"
-#include "entry/text_argument.h"
+#include "entry/call_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 
@@ -29,8 +29,8 @@ public:
     [[nodiscard]] const date::Language& Language() const { return *known_; }
 
 private:
-    TextArgument model_;
-    TextArgument language_;
+    CallText model_;
+    CallText language_;
     const date::Language* known_ = &date::kEnglish;
 };
 
@@ -109,7 +109,7 @@ sword OCIDateLastDay(OCIError* err, const OCIDate* given, OCIDate* out) {
 sword OCIDateNextDay(OCIError* err, const OCIDate* given, const OraText* day, ub4 dayLen, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
         if (!given || !day || !out) return Error(errors::kNullArgument);
-        const TextArgument name(error.Env(), day, dayLen, false);
+        const CallText name(error.Env(), day, dayLen, false);
         if (!name.Valid()) return Error(errors::kBadText);
         int day_of_week = 0;
         if (const int number = date::WeekdayFromName(name.View(), date::kEnglish, &day_of_week)) return Error(number);
@@ -150,7 +150,7 @@ sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraTe
                       const OraText* lang, ub4 langLen, OCIDate* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
         if (!str || !out) return Error(errors::kNullArgument);
-        const TextArgument text(error.Env(), str, strLen, false);
+        const CallText text(error.Env(), str, strLen, false);
         if (!text.Valid()) return Error(errors::kBadText);
         ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
         if (const int number = arguments.Resolve()) return Error(number);

@@ -2,7 +2,7 @@
 // the same. Fractions are nanoseconds, or microseconds when kelpcli.ini says so.
 #include "date/descriptor.h"
 #include "date/fraction.h"
-#include "entry/text_argument.h"
+#include "entry/call_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 
@@ -60,7 +60,7 @@ sword OCIDateTimeConstruct(dvoid* hndl, OCIError* err, OCIDateTime* date, sb2 ye
     return EnterDateTime(hndl, err, date, [&](Environment& environment, DateTimeDescriptor& descriptor) -> Status {
         date::DateTime fields{.year = year, .month = month, .day = day, .hour = hour, .minute = min, .second = sec};
         if (!date::FractionToNanoseconds(fsec, &fields.nanosecond)) return Error(errors::kBadFraction);
-        const TextArgument zone(environment, tz, tzLen, false);
+        const CallText zone(environment, tz, tzLen, false);
         return zone.Valid() ? descriptor.Construct(fields, zone.View()) : Error(errors::kBadText);
     });
 }

@@ -2,7 +2,7 @@
 // texts come and go.
 #include <string>
 
-#include "entry/text_argument.h"
+#include "entry/call_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "number/format.h"
@@ -111,8 +111,8 @@ public:
     [[nodiscard]] const number::Nls& Nls() const { return nls_; }
 
 private:
-    TextArgument model_;
-    TextArgument nls_text_;
+    CallText model_;
+    CallText nls_text_;
     number::Nls nls_;
 };
 
@@ -354,7 +354,7 @@ sword OCINumberFromText(OCIError* err, const OraText* str, ub4 strLen, const Ora
                         const OraText* nls, ub4 nlsLen, OCINumber* out) {
     return EnterError(err, [&](ErrorHandle& error) -> Status {
         if (!str || !out) return Error(errors::kNullArgument);
-        const TextArgument text(error.Env(), str, strLen, false);
+        const CallText text(error.Env(), str, strLen, false);
         if (!text.Valid()) return Error(errors::kBadText);
         FormatArguments arguments(error.Env(), fmt, fmtLen, nls, nlsLen);
         if (const Errno problem = arguments.Resolve()) return Error(problem);

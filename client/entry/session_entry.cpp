@@ -3,7 +3,7 @@
 // one link's at a time: a session may be another context's, and another thread may end it meanwhile.
 #include <string>
 
-#include "entry/text_argument.h"
+#include "entry/call_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "oci.h"
@@ -14,7 +14,7 @@ namespace {
 constexpr ub4 kPasswordChangeLogsOn = OCI_AUTH;
 
 Status ReadText(const Environment& environment, const OraText* text, ub4 length, std::string& utf8) {
-    const TextArgument in(environment, text, length, false);
+    const CallText in(environment, text, length, false);
     if (!in.Valid()) return Error(errors::kBadText);
     utf8 = in.View();
     return {};

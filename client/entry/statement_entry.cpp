@@ -1,5 +1,5 @@
 // Statements: prepare, release, execute, fetch, result sets, bind information, pieces.
-#include "entry/text_argument.h"
+#include "entry/call_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "sessions/service_context.h"
@@ -20,7 +20,7 @@ Status Prepare(Statement& statement, const OraText* sql, ub4 length, ub4 languag
     if (!sql || length == 0) return Error(errors::kNoText);
     if (Status status = CheckSyntax(language); !status.Ok()) return status;
     if (mode & ~ub4{OCI_UTF16}) return Error(errors::kBadMode);
-    const TextArgument text(statement.Env(), sql, length, mode & OCI_UTF16);
+    const CallText text(statement.Env(), sql, length, mode & OCI_UTF16);
     if (!text.Valid()) return Error(errors::kBadText);
     return text.View().empty() ? Error(errors::kNoText) : statement.Prepare(text.View());
 }
@@ -30,8 +30,8 @@ Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 
     if (!out) return Error(errors::kNullArgument);
     if (Status status = CheckSyntax(language); !status.Ok()) return status;
     if (mode & ~ub4{OCI_PREP2_CACHE_SEARCHONLY | OCI_UTF16}) return Error(errors::kBadMode);
-    const TextArgument text(service.Env(), sql, length, mode & OCI_UTF16);
-    const TextArgument tag(service.Env(), key, key_length, mode & OCI_UTF16);
+    const CallText text(service.Env(), sql, length, mode & OCI_UTF16);
+    const CallText tag(service.Env(), key, key_length, mode & OCI_UTF16);
     if (!text.Valid() || !tag.Valid()) return Error(errors::kBadText);
     Statement* statement = nullptr;
     const bool search_only = mode & OCI_PREP2_CACHE_SEARCHONLY;
@@ -42,7 +42,7 @@ Status Prepare2(ServiceContext& service, OCIStmt** out, const OraText* sql, ub4 
 
 Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length, ub4 mode) {
     if (mode & ~ub4{OCI_STRLS_CACHE_DELETE}) return Error(errors::kBadMode);
-    const TextArgument tag(statement.Env(), key, key_length, false);
+    const CallText tag(statement.Env(), key, key_length, false);
     if (!tag.Valid()) return Error(errors::kBadText);
     return Release(statement, tag.View(), !(mode & OCI_STRLS_CACHE_DELETE));
 }
@@ -59,7 +59,11 @@ sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece) {
     return Enter<Handle>(object, err, [&](Handle& handle) {
         const std::shared_ptr<StatementShare> owner = handle.area->Owner();
         Statement* statement = owner ? owner->Find() : nullptr;
-        return statement ? statement->SetPieceInfo(*handle.area, piece) : Error(errors::kIllegalOperation);
+        if (!statement) return Error(errors::kIllegalOperation);
+        const SerialLock lock(*statement);
+        // Without a session there is no lock, and nothing that could wait for a piece.
+        const bool locked = !statement->Env().Threaded() || statement->Serial();
+        return locked ? statement->SetPieceInfo(*handle.area, piece) : Error(errors::kIllegalOperation);
     });
 }
 

@@ -122,6 +122,8 @@ std::size_t TableCount() noexcept {
     return TheWriter().tables.size();
 }
 
+constinit std::atomic<std::uint64_t> erased_objects{0};
+
 bool Erase(const void* pointer) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
@@ -129,6 +131,7 @@ bool Erase(const void* pointer) noexcept {
     Slot* slot = FindSlot(table, pointer);
     if (!slot) return false;
     slot->store(kErased, std::memory_order_release);
+    erased_objects.store(erased_objects.load(std::memory_order_relaxed) + 1, std::memory_order_release);
     --writer.living;
     auto index = static_cast<std::size_t>(slot - table.slots);
     if (table.slots[table.Next(index)].load(std::memory_order_relaxed) != kEmpty) return true;

@@ -71,6 +71,8 @@ inline Kind KindOf(const void* pointer) noexcept {
 // The object must not be in the set. Throws std::bad_alloc and changes nothing then.
 void Insert(const void* pointer, Kind kind);
 bool Erase(const void* pointer) noexcept;    // false when it is not in the set
+// Goes up with each object that is erased: who has found some living need not look again while it stands.
+extern constinit std::atomic<std::uint64_t> erased_objects;
 // Nothing for an object that another thread has erased. As Kind::none an object stays in the set, but is not found.
 void Retype(const void* pointer, Kind kind) noexcept;
 bool Contains(const void* pointer) noexcept;    // of any kind, Kind::none too

@@ -21,9 +21,12 @@ int LoadCollected(BindArea& bind, engine::Datum& value) {
 
 Status BindRows::Collect(const BoundText& text, const sql::EngineText& sql) {
     table_element = 0;
+    const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
+    if (collected_ == text.Changes() && seen_ == erased) return {};
     const auto& placeholders = sql.placeholders;
     for (const std::uint32_t placeholder : placeholders)
         if (!text.IsBound(placeholder)) return Error(errors::kNotAllBound);
+    seen_ = erased;
     if (collected_ == text.Changes()) return {};
     collected_ = 0;
     has_tables_ = false;

@@ -39,6 +39,7 @@ private:
 
     std::vector<Slot> slots_;
     std::uint32_t collected_ = 0;    // the text's changes when it was; 0: not yet
+    std::uint64_t seen_ = 0;         // erased objects when all binds were found living
     bool has_tables_ = false;
     std::span<const engine::Kind> widened_;
 };

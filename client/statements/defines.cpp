@@ -34,7 +34,11 @@ bool Defines::AllLive() const {
 }
 
 Status Defines::Activate(const std::vector<engine::Column>& columns) {
-    if (!changed_ && AllLive()) return {};
+    const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
+    if (!changed_ && (erased == seen_ || AllLive())) {
+        seen_ = erased;
+        return {};
+    }
     changed_ = true;
     active_.clear();
     in_pieces_ = false;
@@ -50,6 +54,7 @@ Status Defines::Activate(const std::vector<engine::Column>& columns) {
     }
     if (active_.empty()) return Error(errors::kNoDefines);
     changed_ = false;
+    seen_ = erased;
     return {};
 }
 

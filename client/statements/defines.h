@@ -52,5 +52,6 @@ private:
     std::vector<std::shared_ptr<DataArea>> retired_;    // of the text before
     std::vector<Active> active_;
     bool changed_ = true;    // since active_ was made
+    std::uint64_t seen_ = 0;    // erased objects when all of active_ were found living
     bool in_pieces_ = false;
 };

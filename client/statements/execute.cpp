@@ -214,27 +214,35 @@ Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
 
 Status Statement::RunChange(ErrorHandle& error, const ExecuteArguments& arguments) {
     if (Status status = CheckRange(arguments); !status.Ok()) return status;
-    engine::ArrayOutcome outcome;
-    Status status = RunRows(arguments, outcome);
-    return status.Failed() ? status : Finish(error, arguments, outcome);
+    ForgetOutcome();
+    Status status = RunRows(arguments);
+    return status.Failed() ? status : Finish(error, arguments);
+}
+
+// The room for failures stays for the next execute.
+void Statement::ForgetOutcome() noexcept {
+    outcome_.affected = 0;
+    outcome_.executed = 0;
+    outcome_.failures.clear();
+    outcome_.last_row.reset();
 }
 
 // Runs the rows [first, iterations) and adds what they did.
-Status Statement::RunRows(const ExecuteArguments& arguments, engine::ArrayOutcome& outcome) {
+Status Statement::RunRows(const ExecuteArguments& arguments) {
     const sql::Step& step = Scanned().steps[0];
     Compiled* compiled = nullptr;
     if (Status status = CompileForValues(compiled); !status.Ok()) return status;
     engine::ArrayRun run{arguments.first, arguments.iterations, (arguments.mode & OCI_BATCH_ERRORS) != 0, nullptr};
-    if (compiled->query->Columns().empty()) return compiled->query->ExecuteArray(compiled->rows, run, outcome);
+    if (compiled->query->Columns().empty()) return compiled->query->ExecuteArray(compiled->rows, run, outcome_);
     SetReturned(step, 0);
     Targets targets(text_, step, *compiled->query, Targets::Layout::each_execution);
     run.returned = &targets;
-    const std::uint32_t done_before = outcome.executed;
-    Status status = compiled->query->ExecuteArray(compiled->rows, run, outcome);
-    if (status.Ok() && outcome.executed > done_before) {
+    const std::uint32_t done_before = outcome_.executed;
+    Status status = compiled->query->ExecuteArray(compiled->rows, run, outcome_);
+    if (status.Ok() && outcome_.executed > done_before) {
         // The last execution that succeeded: failures behind it are those of the rows at the end.
-        ub4 last = run.all_rows || outcome.failures.empty() ? arguments.iterations : outcome.failures.back().row;
-        for (auto failure = outcome.failures.rbegin(); failure != outcome.failures.rend(); ++failure)
+        ub4 last = run.all_rows || outcome_.failures.empty() ? arguments.iterations : outcome_.failures.back().row;
+        for (auto failure = outcome_.failures.rbegin(); failure != outcome_.failures.rend(); ++failure)
             if (failure->row + 1 == last) last = failure->row;
         SetReturned(step, targets.RowsOf(last - 1));
     }
@@ -248,19 +256,19 @@ void Statement::SetReturned(const sql::Step& step, std::uint32_t rows) {
 }
 
 // What an array execute did shows whatever goes wrong in telling it.
-Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments, engine::ArrayOutcome& outcome) {
-    run_.row_count = outcome.affected;
-    run_.last_row = outcome.last_row;
-    run_.failed_rows = static_cast<std::uint32_t>(outcome.failures.size());
-    if (outcome.failures.empty()) return {};
-    for (const auto& failure : outcome.failures) UsedLink()->Answered(failure.status);
+Status Statement::Finish(ErrorHandle& error, const ExecuteArguments& arguments) {
+    run_.row_count = outcome_.affected;
+    run_.last_row = outcome_.last_row;
+    run_.failed_rows = static_cast<std::uint32_t>(outcome_.failures.size());
+    if (outcome_.failures.empty()) return {};
+    for (const auto& failure : outcome_.failures) UsedLink()->Answered(failure.status);
     if (!(arguments.mode & OCI_BATCH_ERRORS)) {
-        error.row_offset = outcome.failures.front().row;
-        return std::move(outcome.failures.front().status);
+        error.row_offset = outcome_.failures.front().row;
+        return std::move(outcome_.failures.front().status);
     }
-    const bool cut_short = outcome.executed + outcome.failures.size() < arguments.iterations - arguments.first;
-    Status last = cut_short ? outcome.failures.back().status : Status();
-    for (auto& failure : outcome.failures) error.row_failures.push_back({failure.row, std::move(failure.status)});
+    const bool cut_short = outcome_.executed + outcome_.failures.size() < arguments.iterations - arguments.first;
+    Status last = cut_short ? outcome_.failures.back().status : Status();
+    for (auto& failure : outcome_.failures) error.row_failures.push_back({failure.row, std::move(failure.status)});
     return cut_short ? last : Warning(errors::kRowsFailed);
 }
 

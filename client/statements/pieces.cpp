@@ -1,7 +1,5 @@
 // Statements: executes and fetches whose values go in pieces. They end with OCI_NEED_DATA where the driver waits for the
 // application, and go on with the next call of the same function.
-#include <utility>
-
 #include "handles/errors.h"
 #include "statements/fetch_sink.h"
 
@@ -68,7 +66,7 @@ Status Statement::ContinueFetch() {
 
 Status Statement::StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments) {
     pieces_.StartExecute(text_, arguments);
-    collected_ = {};
+    ForgetOutcome();
     return ContinueExecute(error);
 }
 
@@ -92,13 +90,12 @@ Status Statement::RunCollected(ErrorHandle& error, bool& more) {
         return Run(error, arguments);
     }
     const ub4 row = pieces_.Wanted().iteration;
-    Status status = RunRows({row + 1, row, arguments.mode}, collected_);
-    run_.row_count = collected_.affected;
-    const bool stop = status.Failed() || (!collected_.failures.empty() && !(arguments.mode & OCI_BATCH_ERRORS));
+    Status status = RunRows({row + 1, row, arguments.mode});
+    run_.row_count = outcome_.affected;
+    const bool stop = status.Failed() || (!outcome_.failures.empty() && !(arguments.mode & OCI_BATCH_ERRORS));
     more = !stop && row + 1 < arguments.iterations;
     if (more) return {};
-    engine::ArrayOutcome outcome = std::exchange(collected_, {});
     pieces_.End();
     if (status.Failed()) return status;
-    return Complete(Finish(error, arguments, outcome), arguments);
+    return Complete(Finish(error, arguments), arguments);
 }

@@ -137,10 +137,11 @@ private:
     Status Complete(Status status, const ExecuteArguments& arguments);
     Status RunQuery(const ExecuteArguments& arguments);
     Status RunChange(ErrorHandle& error, const ExecuteArguments& arguments);
-    Status RunRows(const ExecuteArguments& arguments, engine::ArrayOutcome& outcome);
+    Status RunRows(const ExecuteArguments& arguments);
+    void ForgetOutcome() noexcept;
     Status RunOnce(const ExecuteArguments& arguments);
     Status RunControl(const ExecuteArguments& arguments);
-    Status Finish(ErrorHandle& error, const ExecuteArguments& arguments, engine::ArrayOutcome& outcome);
+    Status Finish(ErrorHandle& error, const ExecuteArguments& arguments);
     Status FetchAtExecute(const ExecuteArguments& arguments);
     Status WithNotices(ErrorHandle& error, Status status);
 
@@ -180,7 +181,7 @@ private:
     std::uint32_t parse_error_offset_ = 0;    // in the UTF-8 text
     Execution run_;
     PieceStream pieces_;
-    engine::ArrayOutcome collected_;    // of the iterations that an execute in pieces has run
+    engine::ArrayOutcome outcome_;    // of the execute; of one in pieces, what its iterations did so far
     PollingDriver driver_;
     std::vector<Parameter*> parameters_;    // by position - 1, as handed out; perhaps freed since
 };

@@ -51,27 +51,34 @@ TEST_F(Threads, StatementsOfOneSession) {
     EXPECT_EQ(One("select count(distinct a) from t"), "200");
 }
 
-// One thread asks the application's own bind, a define's position and a parameter, while another frees their statement.
+// One thread asks the application's own bind and a parameter, while another frees their statement.
 TEST_F(Threads, HandlesAskedWhileTheirStatementIsFreed) {
-    constexpr int kRounds = 1500;
-    std::atomic<int> round = 0, failures = 0;
-    std::atomic<OCIStmt*> made{nullptr};
-    std::atomic<dvoid*> parameter{nullptr};
+    constexpr int kRounds = 1000;
+    // Even: the statement is being made. Odd: it is asked for and freed. The asker says how far it is.
+    std::atomic<int> phase = 0, asked = 0, failures = 0;
+    dvoid* parameter = nullptr;
     auto* const bind = New<OCIBind>(OCI_HTYPE_BIND);
     std::thread asking([&] {
         OCIError* error = New<OCIError>(OCI_HTYPE_ERROR);
-        while (round < kRounds) {
-            ub4 position = 0;
-            failures += OCIAttrGet(bind, OCI_HTYPE_BIND, &position, nullptr, OCI_ATTR_HANDLE_POSITION, error) != OCI_SUCCESS;
-            sb4 value = 0;
-            ub4 length = 4;
-            (void)OCIStmtSetPieceInfo(bind, OCI_HTYPE_BIND, error, &value, &length, OCI_ONE_PIECE, nullptr, nullptr);
-            ub2 type = 0;
-            (void)OCIAttrGet(parameter.load(), OCI_DTYPE_PARAM, &type, nullptr, OCI_ATTR_DATA_TYPE, error);
+        for (int round = 0; round < kRounds; ++round) {
+            while (phase != 2 * round + 1) std::this_thread::yield();
+            for (int times = 0; times < 3 || phase == 2 * round + 1; ++times) {
+                ub4 position = 0;
+                failures +=
+                    OCIAttrGet(bind, OCI_HTYPE_BIND, &position, nullptr, OCI_ATTR_HANDLE_POSITION, error) != OCI_SUCCESS;
+                failures += position != 1;
+                sb4 value = 0;
+                ub4 length = 4;
+                (void)OCIStmtSetPieceInfo(bind, OCI_HTYPE_BIND, error, &value, &length, OCI_ONE_PIECE, nullptr, nullptr);
+                ub2 type = 0;
+                (void)OCIAttrGet(parameter, OCI_DTYPE_PARAM, &type, nullptr, OCI_ATTR_DATA_TYPE, error);
+                asked = 2 * round + 1;
+            }
+            asked = 2 * round + 2;
         }
     });
     sb4 value = 1;
-    for (; round < kRounds; ++round) {
+    for (int round = 0; round < kRounds; ++round) {
         OCIStmt* statement = New<OCIStmt>(OCI_HTYPE_STMT);
         OCIBind* own = bind;
         failures += Prepare(statement, "select :1 from dual") != 0;
@@ -79,10 +86,12 @@ TEST_F(Threads, HandlesAskedWhileTheirStatementIsFreed) {
                                  OCI_DEFAULT);
         failures += own != bind;
         failures += OCIStmtExecute(svc, statement, err, 0, 0, nullptr, nullptr, OCI_DEFAULT);
-        dvoid* column = nullptr;
-        failures += OCIParamGet(statement, OCI_HTYPE_STMT, err, &column, 1);
-        parameter = column;
+        failures += OCIParamGet(statement, OCI_HTYPE_STMT, err, &parameter, 1);
+        phase = 2 * round + 1;
+        while (asked < 2 * round + 1) std::this_thread::yield();
         failures += OCIHandleFree(statement, OCI_HTYPE_STMT);
+        phase = 2 * round + 2;
+        while (asked < 2 * round + 2) std::this_thread::yield();
     }
     asking.join();
     EXPECT_EQ(failures, 0);

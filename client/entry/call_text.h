@@ -12,9 +12,9 @@
 #include "oci.h"
 #include "platform/utf.h"
 
-class TextArgument {
+class CallText {
 public:
-    TextArgument(const Environment& environment, const OraText* text, std::size_t length, bool utf16) {
+    CallText(const Environment& environment, const OraText* text, std::size_t length, bool utf16) {
         if (!text) return;
         if (environment.Utf16() || utf16) {
             valid_ = utf::ToUtf8(text, Utf16Length(text, length), converted_);
