@@ -141,10 +141,10 @@ TEST_F(CallsTest, UserMemoryComesZeroedAndIsFoundAgain) {
 // Whatever is no living handle of the kind: null, text, a handle of another kind, one that is freed.
 TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
     char text[15] = "Invalid buffer";
-    dvoid* freed = NewHandle<dvoid>(env_, OCI_HTYPE_SVCCTX);
-    OCIHandleFree(freed, OCI_HTYPE_SVCCTX);
     dvoid* other = NewHandle<dvoid>(env_, OCI_HTYPE_TRANS);
     OCIServer* server = NewHandle<OCIServer>(env_, OCI_HTYPE_SERVER);
+    dvoid* freed = NewHandle<dvoid>(env_, OCI_HTYPE_SVCCTX);
+    OCIHandleFree(freed, OCI_HTYPE_SVCCTX);    // last: no other handle lies where it lay
     ub4 number = 0;
     dvoid* out = nullptr;
     for (dvoid* bad :
