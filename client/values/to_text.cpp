@@ -159,9 +159,27 @@ View ModelOf(ColumnClass column) {
     }
 }
 
+// The default model of dates by hand: most dates are shown so, and a result set is full of them.
+std::size_t ShortDate(const date::DateTime& value, char* text) {
+    constexpr char kMonths[] = "JANFEBMARAPRMAYJUNJULAUGSEPOCTNOVDEC";
+    const auto put = [text](std::size_t at, int number) {
+        text[at] = static_cast<char>('0' + number / 10 % 10);
+        text[at + 1] = static_cast<char>('0' + number % 10);
+    };
+    put(0, value.day);
+    text[2] = text[6] = '-';
+    std::copy_n(kMonths + (value.month - 1) * 3, 3, text + 3);
+    put(7, value.year);
+    return 9;
+}
+
 int ModelText(const date::DateTime& value, Workspace& workspace, View& text) {
     std::size_t length = 0;
     char* begin = workspace.small.data();
+    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0 && value.month <= 12) {
+        text = {begin, ShortDate(value, begin)};
+        return 0;
+    }
     const auto scope = workspace.column == ColumnClass::date ? date::Scope::date : date::Scope::timestamp;
     const int error = date::ToText(value, ModelOf(workspace.column), date::kEnglish, scope, begin,
                                    workspace.small.size(), &length);
