@@ -5,18 +5,13 @@
 
 namespace {
 
-// Counts what goes through.
-class CountingSink final : public engine::RowSink {
+// Rows that nobody wants.
+class Nowhere final : public CountedSink {
 public:
-    explicit CountingSink(engine::RowSink* behind) : behind_(behind) {}
-    Status Row(std::uint32_t execution, std::span<const engine::Datum> values) override {
+    Status Row(std::uint32_t, std::span<const engine::Datum>) override {
         ++rows;
-        return behind_ ? behind_->Row(execution, values) : Status();
+        return {};
     }
-    std::uint32_t rows = 0;
-
-private:
-    engine::RowSink* behind_;
 };
 
 }  // namespace
@@ -41,24 +36,24 @@ void Cursor::Close() noexcept {
     position_ = reached_ = 0;
 }
 
-Status Cursor::Read(engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered) {
+Status Cursor::Read(CountedSink& sink, std::uint32_t most, std::uint32_t& delivered) {
     delivered = 0;
     if (scrollable_) return ReadFrom(position_ + 1, sink, most, delivered);
     if (at_end_ || most == 0) return {};
-    CountingSink counting(&sink);
     bool more = true;
-    Status status = query_->Fetch(counting, most, more);
-    delivered = counting.rows;
+    const std::uint32_t before = sink.rows;
+    Status status = query_->Fetch(sink, most, more);
+    delivered = sink.rows - before;
     reached_ = position_ += delivered;
     if (status.Ok()) at_end_ = !more;
     return status;
 }
 
-Status Cursor::ReadFrom(std::uint64_t position, engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered) {
-    CountingSink counting(&sink);
+Status Cursor::ReadFrom(std::uint64_t position, CountedSink& sink, std::uint32_t most, std::uint32_t& delivered) {
+    const std::uint32_t before = sink.rows;
     bool found = false;
     delivered = 0;
-    Status status = query_->Scroll(position, counting, found);
+    Status status = query_->Scroll(position, sink, found);
     if (status.Ok() && !found) {
         position_ = 0;
         if (position == 0) return {};
@@ -67,8 +62,8 @@ Status Cursor::ReadFrom(std::uint64_t position, engine::RowSink& sink, std::uint
         return status;
     }
     bool more = true;
-    if (status.Ok() && most > 1) status = query_->Fetch(counting, most - 1, more);
-    delivered = counting.rows;
+    if (status.Ok() && most > 1) status = query_->Fetch(sink, most - 1, more);
+    delivered = sink.rows - before;
     if (delivered == 0) return status;
     position_ = position + delivered - 1;
     reached_ = std::max(reached_, position_);
@@ -76,7 +71,7 @@ Status Cursor::ReadFrom(std::uint64_t position, engine::RowSink& sink, std::uint
 }
 
 Status Cursor::AnyMore(bool& more) {
-    CountingSink nowhere(nullptr);
+    Nowhere nowhere;
     std::uint32_t delivered = 0;
     Status status = Read(nowhere, 1, delivered);
     more = delivered > 0;

@@ -10,6 +10,12 @@
 
 #include "engine/engine.h"
 
+// A sink that counts what it gets, a row that it refuses with the others.
+class CountedSink : public engine::RowSink {
+public:
+    std::uint32_t rows = 0;
+};
+
 class Cursor {
 public:
     // Takes an open query: borrowed, or owned (result sets).
@@ -27,9 +33,9 @@ public:
 
     // Up to `most` rows behind the position into the sink. `delivered` counts them, with one that the sink refused; it
     // is below `most` at the end of the rows, or after a failure.
-    Status Read(engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered);
+    Status Read(CountedSink& sink, std::uint32_t most, std::uint32_t& delivered);
     // The row at a position of a scrollable cursor, which `found` says to be there, and on up to `most` rows.
-    Status ReadFrom(std::uint64_t position, engine::RowSink& sink, std::uint32_t most, std::uint32_t& delivered);
+    Status ReadFrom(std::uint64_t position, CountedSink& sink, std::uint32_t most, std::uint32_t& delivered);
     // From behind the last row back to it.
     void StayOnLastRow() noexcept { if (position_ > reached_) position_ = reached_; }
     // Whether there is a row behind the position, which goes with the answer.

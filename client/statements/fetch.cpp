@@ -64,6 +64,7 @@ Status Statement::FindFirst(ub2 orientation, sb4 offset, std::uint64_t& position
 }
 
 Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> values) {
+    ++rows;
     const int error = statement_.defines_.StoreRow(index_, values);
     if (error != 0 && error != errors::kTruncationWarning) return Error(error);
     if (error != 0) warning_ = Warning(error);

@@ -1,9 +1,10 @@
 // Where fetched rows go: into the defines, and what is taken in pieces to the piece stream.
 #pragma once
 
+#include "statements/cursor.h"
 #include "statements/statement.h"
 
-class Statement::FetchSink final : public engine::RowSink {
+class Statement::FetchSink final : public CountedSink {
 public:
     // `first` is the element of the first row.
     FetchSink(Statement& statement, ub4 first, bool in_pieces)
