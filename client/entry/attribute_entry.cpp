@@ -1,4 +1,5 @@
-// OCIAttrGet and OCIAttrSet.
+// OCIAttrGet and OCIAttrSet: the object must be of the type that is named. Its serial lock is held meanwhile; objects
+// without one are the application's to keep apart.
 #include "handles/attributes.h"
 #include "handles/gate.h"
 #include "oci.h"

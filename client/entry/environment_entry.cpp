@@ -1,4 +1,5 @@
-// Environments and the process: OCIEnvCreate, OCIEnvInit, OCIInitialize, OCITerminate, version, block count.
+// Environments and the process: OCIEnvCreate, OCIEnvInit, OCIInitialize, OCITerminate, version, block count. There is
+// no handle yet to leave a record with. From any thread at any time.
 #include <cstdint>
 #include <limits>
 

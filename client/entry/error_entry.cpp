@@ -1,4 +1,5 @@
-// Reading error records: OCIErrorGet.
+// Reading error records: OCIErrorGet. It leaves the records as they are, and leaves none of its own. Threads that share
+// a handle see each other's records.
 #include <cstring>
 #include <optional>
 

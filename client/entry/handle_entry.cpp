@@ -1,4 +1,5 @@
-// Handles and descriptors: OCIHandleAlloc and its kin. One row a type code says what object is made for it.
+// Handles and descriptors: OCIHandleAlloc and its kin. One row a type code says what object is made for it. Any thread
+// may free what others work on: a free holds the object's serial lock, and of several frees one succeeds.
 #include <algorithm>
 #include <span>
 

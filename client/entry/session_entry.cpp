@@ -1,6 +1,6 @@
 // Connections and user sessions: logon, server attach, session begin, password change, versions, ping, break, reset.
-// What begins or ends a session, or works on one, enters without the gate's lock and takes the locks of sessions/ itself,
-// one link's at a time: a session may be another context's, and another thread may end it meanwhile.
+// What begins or ends a session, or works on one, enters without the gate's lock and takes the locks of sessions/
+// itself, one link's at a time: a session may be another context's, and another thread may end it meanwhile.
 #include <string>
 
 #include "entry/call_text.h"

@@ -1,4 +1,5 @@
-// The thread package.
+// The thread package: its calls find their objects inside the gate's call, and wait, where they wait, without keeping
+// what others free. The objects guard themselves.
 #include "handles/errors.h"
 #include "handles/package.h"
 #include "threads/thread.h"

@@ -154,10 +154,12 @@ Status File::Write(const void* data, std::uint32_t size, std::uint32_t* count) {
 
 Status File::Seek(std::uint32_t origin, std::uint64_t offset, int direction) {
     return InTurn([&]() -> Status {
-        if (origin < OCI_FILE_SEEK_BEGINNING || origin > OCI_FILE_SEEK_END) return InvalidArgument("unknown seek origin");
+        if (origin < OCI_FILE_SEEK_BEGINNING || origin > OCI_FILE_SEEK_END)
+            return InvalidArgument("unknown seek origin");
         const bool forward = direction == OCI_FILE_FORWARD;
         if (!forward && direction != OCI_FILE_BACKWARD) return InvalidArgument("unknown seek direction");
-        if (offset > std::uint64_t{std::numeric_limits<std::int64_t>::max()}) return InvalidArgument("offset too large");
+        if (offset > std::uint64_t{std::numeric_limits<std::int64_t>::max()})
+            return InvalidArgument("offset too large");
         constexpr int kOrigins[] = {0, SEEK_SET, SEEK_CUR, SEEK_END};
         const auto distance = static_cast<off_t>(offset);
         last_ = Last::other;

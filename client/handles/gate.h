@@ -1,8 +1,8 @@
 // The gate that every exported function passes: marks the call as in flight, checks the error handle and the object
 // (null, foreign and freed pointers get OCI_INVALID_HANDLE and no record), empties the records, runs the body, turns
 // what it answers or throws into a record and the return code. Bodies answer a Status and may throw. Every pointer is
-// looked up once, and inside the call in flight: what it gives lives until the call's end, whoever frees it. What a body
-// looks up beside the gate's object is not locked by the gate.
+// looked up once, and inside the call in flight: what it gives lives until the call's end, whoever frees it. What a
+// body looks up beside the gate's object is not locked by the gate.
 //
 //   sword OCIPing(OCISvcCtx* svchp, OCIError* errhp, ub4) {
 //       return Enter<ServiceContext>(svchp, errhp, [](ServiceContext& service) { return service.Ping(); });

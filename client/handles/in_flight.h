@@ -12,12 +12,13 @@
 // waits in the list of that call's slot; when the call leaves, the next such call takes it over, and where there is
 // none it is destroyed. One thread at a time destroys.
 //
-// Proof that a call which has found an object is always seen by whoever frees it. R frees the object: it takes it out of
-// the set, makes the barrier B and then reads the slots. T finds it: it stores into its slot, makes a barrier of its
+// Proof that a call which has found an object is always seen by whoever frees it. R frees the object: it takes it out
+// of the set, makes the barrier B and then reads the slots. T finds it: it stores into its slot, makes a barrier of its
 // own (Fence) and then reads the set.
-//  1. T's call holds the object by having entered. B and T's Fence are sequentially consistent fences in effect (below),
-//     so one comes first. If B does, T reads the set after the object was taken out and does not find it. Else R reads
-//     `entered` after T stored it: it sees that call or a later one of T's. A later one means that the call has ended.
+//  1. T's call holds the object by having entered. B and T's Fence are sequentially consistent fences in effect
+//     (below), so one comes first. If B does, T reads the set after the object was taken out and does not find it. Else
+//     R reads `entered` after T stored it: it sees that call or a later one of T's. A later one means that the call has
+//     ended.
 //  2. entered < retired then. R makes `retired` by fetch_add after B and T read `entered` before its Fence: had T read
 //     R's value or a later one, acquire and release would have ordered the taking out before T's look-up (acq_rel on
 //     current_epoch, whose changes are one release sequence).
@@ -35,9 +36,9 @@
 // The barrier of R is the system's (membarrier), which makes every running thread fence: then a signal fence is enough
 // for T, which is what makes entering cheap. Where the system has none both fence.
 //
-// What a reader may hold, and until when. A pointer that Live gave: until the outermost CallInFlight of the thread ends,
-// LongCalls and callbacks included. What hangs below such an object, or what it belongs to: as long, since those die
-// with it or after it (an environment goes after the last of its objects). Pointers found elsewhere, such as in a
+// What a reader may hold, and until when. A pointer that Live gave: until the outermost CallInFlight of the thread
+// ends, LongCalls and callbacks included. What hangs below such an object, or what it belongs to: as long, since those
+// die with it or after it (an environment goes after the last of its objects). Pointers found elsewhere, such as in a
 // server's list of sessions: as long as a lock is held that is also held while the object is destroyed (SerialLock).
 //
 // What is bounded: objects wait for calls that run, and for a LongCall only if they lived before it began (before the

@@ -86,7 +86,8 @@ void Rebuild(Writer& writer) {
     }
     writer.occupied = occupied;
     current.store(&owned->table, std::memory_order_release);
-    std::erase_if(writer.tables, [](const auto& table) { return table->retired && in_flight::AllLeft(table->retired); });
+    std::erase_if(writer.tables,
+                  [](const auto& table) { return table->retired && in_flight::AllLeft(table->retired); });
     if (!writer.tables.empty()) writer.tables.back()->retired = in_flight::Retire();
     writer.tables.push_back(std::move(owned));
 }

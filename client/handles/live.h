@@ -1,7 +1,7 @@
 // The set of living objects: a hash table of words, each an object's address and its kind in one, so that a place that
 // is freed and taken by another object never answers a kind that is not its object's. Readers take no lock and read
-// nothing but the table; writers hold a mutex. A table that grew, or got rid of erased words, is published anew; the old
-// one is freed when no call that looks up can be reading it. Asked inside a call in flight only.
+// nothing but the table; writers hold a mutex. A table that grew, or got rid of erased words, is published anew; the
+// old one is freed when no call that looks up can be reading it. Asked inside a call in flight only.
 #pragma once
 
 #include <atomic>

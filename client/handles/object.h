@@ -2,8 +2,9 @@
 //
 // An object belongs to an environment and hangs below a parent (the environment, a statement, a describe handle, ...):
 // destroying the parent destroys it. Its memory comes from the environment. What the application passes in is checked
-// by Live, which asks the set of living objects and never reads the memory behind an unknown pointer. Objects are looked
-// up and used inside a call in flight (in_flight.h says for how long); what they hold is guarded by their serial mutex.
+// by Live, which asks the set of living objects and never reads the memory behind an unknown pointer. Objects are
+// looked up and used inside a call in flight (in_flight.h says for how long); what they hold is guarded by their serial
+// mutex.
 #pragma once
 
 #include <atomic>

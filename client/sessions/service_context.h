@@ -62,8 +62,8 @@ private:
     Session* own_session_ = nullptr;
 };
 
-// The turn on the session that a context is used with, for calls that hold no other: `link` is locked and open, or null,
-// and `status` tells why.
+// The turn on the session that a context is used with, for calls that hold no other: `link` is locked and open, or
+// null, and `status` tells why.
 class SessionTurn {
 public:
     explicit SessionTurn(ServiceContext& service);

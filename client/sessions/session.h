@@ -1,8 +1,9 @@
 // User sessions: who is logged on, and the link that the session's work runs on. Session handles also carry the names
 // and passwords for pools (they are authentication handles).
 //
-// Threads: a session that is begun is used under the serial lock of its link, which Begin, End and Drop take themselves;
-// of several threads that begin one session, one does. No thread holds the locks of two links that it waits for.
+// Threads: a session that is begun is used under the serial lock of its link, which Begin, End and Drop take
+// themselves; of several threads that begin one session, one does. No thread holds the locks of two links that it waits
+// for.
 #pragma once
 
 #include <atomic>

@@ -16,8 +16,8 @@ constexpr std::size_t kTerminator = 2;
 
 Variable::~Variable() { Env().Release(data_); }
 
-// The content is looked at when the memory functions have been called, and the old block given back when it is no longer
-// this value's.
+// The content is looked at when the memory functions have been called, and the old block given back when it is no
+// longer this value's.
 template <class Content>
 void Variable::Replace(std::uint32_t room, Content content) {
     auto* block = static_cast<char*>(Env().Allocate(room + kTerminator));

@@ -1,6 +1,6 @@
 // Threads. Each thread of the process that meets the package gets a record: who it is, and its values of keys. A record
-// is its thread's alone. It ends by the system's own thread-specific data, whose destructor runs when a thread ends, but
-// not for the main thread when the process does.
+// is its thread's alone. It ends by the system's own thread-specific data, whose destructor runs when a thread ends,
+// but not for the main thread when the process does.
 #include "threads/thread.h"
 
 #include "handles/errors.h"
