@@ -117,14 +117,16 @@ Armed::~Armed() { armed = before_; }
 
 void* ApplicationMemory::Allocate(void*, std::size_t size) {
     if (Refused(Whose::application, "application", size)) return nullptr;
-    void* block = Uncounted(size);
-    if (block) ++application_blocks;
-    return block;
+    auto* block = static_cast<char*>(Uncounted(size + 1));
+    if (!block) return nullptr;
+    ++application_blocks;
+    std::memset(block, 0x5A, size + 1);
+    return block + 1;
 }
 
 void ApplicationMemory::Release(void*, void* block) {
     --application_blocks;
-    std::free(block);
+    std::free(static_cast<char*>(block) - 1);
 }
 
 long ApplicationMemory::Blocks() { return application_blocks; }

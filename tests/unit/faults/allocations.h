@@ -39,7 +39,8 @@ private:
     bool before_;
 };
 
-// The memory functions given to environments, and how many of their blocks are out.
+// The memory functions given to environments, and how many of their blocks are out. Blocks are aligned to nothing and
+// hold what was there before.
 struct ApplicationMemory {
     static void* Allocate(void*, std::size_t size);
     static void Release(void*, void* block);

@@ -120,12 +120,11 @@ void RunPlansApart(const Case& c) {
 }
 
 // Runs before all others: what the library makes once a process is made, and fails, in the processes begun here.
-TEST(FirstCalls, OfAProcess) {
+class FirstCalls : public testing::TestWithParam<Case> {};
+
+TEST_P(FirstCalls, OfAProcess) {
     ASSERT_EQ(World::Made(), 0) << "the library is in use already";
-    const Scenario& from_nothing = HandleScenarios().front();
-    for (const Whose whose : {Whose::application, Whose::library}) {
-        for (const How how : {How::alone, How::from_then_on}) RunPlansApart({from_nothing, whose, how});
-    }
+    RunPlansApart(GetParam());
 }
 
 class Faults : public testing::TestWithParam<Case> {};
@@ -138,9 +137,10 @@ TEST_P(Faults, AtEachAllocation) {
     EXPECT_EQ(Held(), before);
 }
 
-std::vector<Case> AllCases() {
+std::vector<Case> Cases(bool first_calls_alone) {
     std::vector<Case> cases;
     for (const Scenario& scenario : AllScenarios()) {
+        if (first_calls_alone && !scenario.first_calls) continue;
         for (const Whose whose : {Whose::application, Whose::library}) {
             for (const How how : {How::alone, How::from_then_on}) cases.push_back({scenario, whose, how});
         }
@@ -154,7 +154,8 @@ std::string NameOf(const testing::TestParamInfo<Case>& info) {
            (c.how == How::alone ? "_Alone" : "_FromThenOn");
 }
 
-INSTANTIATE_TEST_SUITE_P(Memory, Faults, testing::ValuesIn(AllCases()), NameOf);
+INSTANTIATE_TEST_SUITE_P(Memory, FirstCalls, testing::ValuesIn(Cases(true)), NameOf);
+INSTANTIATE_TEST_SUITE_P(Memory, Faults, testing::ValuesIn(Cases(false)), NameOf);
 
 }  // namespace
 }  // namespace faults

@@ -1,6 +1,7 @@
 // Environments, handles and descriptors, logons, accounts, error records.
 #include <cstring>
 #include <filesystem>
+#include <thread>
 
 #include "faults/scenarios.h"
 
@@ -62,22 +63,25 @@ void InitializeAndLogOn2(World& w) {
     w.See(w.Attribute<ub4>(OCI_ATTR_STMTCACHESIZE, w.svc, OCI_HTYPE_SVCCTX));
 }
 
-// Frees nothing but what was made undisturbed: an end takes no memory, even as a thread's first call.
+// Frees what another thread made undisturbed: an end takes no memory, even as a thread's first call.
 void FreeingTakesNoMemory(World& w) {
     OCIEnv* env = nullptr;
     dvoid* err = nullptr;
     dvoid* stmt = nullptr;
     dvoid* descriptor = nullptr;
     OCISvcCtx* svc = nullptr;
-    OCIEnvCreate(&env, OCI_DEFAULT, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 0,
-                 nullptr);
-    OCIHandleAlloc(env, &err, OCI_HTYPE_ERROR, 0, nullptr);
-    OCILogon(env, static_cast<OCIError*>(err), &svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8);
-    OCIHandleAlloc(env, &stmt, OCI_HTYPE_STMT, 0, nullptr);
-    OCIDescriptorAlloc(env, &descriptor, OCI_DTYPE_TIMESTAMP, 0, nullptr);
-    OCIStmtPrepare(static_cast<OCIStmt*>(stmt), static_cast<OCIError*>(err), World::Text("select 1 from dual"), 18,
-                   OCI_NTV_SYNTAX, OCI_DEFAULT);
-    OCIStmtExecute(svc, static_cast<OCIStmt*>(stmt), static_cast<OCIError*>(err), 0, 0, nullptr, nullptr, OCI_DEFAULT);
+    std::thread([&] {
+        OCIEnvCreate(&env, OCI_DEFAULT, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 0,
+                     nullptr);
+        OCIHandleAlloc(env, &err, OCI_HTYPE_ERROR, 0, nullptr);
+        auto* const error = static_cast<OCIError*>(err);
+        OCILogon(env, error, &svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8);
+        OCIHandleAlloc(env, &stmt, OCI_HTYPE_STMT, 0, nullptr);
+        OCIDescriptorAlloc(env, &descriptor, OCI_DTYPE_TIMESTAMP, 0, nullptr);
+        auto* const query = static_cast<OCIStmt*>(stmt);
+        OCIStmtPrepare(query, error, World::Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT);
+        EXPECT_EQ(OCIStmtExecute(svc, query, error, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
+    }).join();
     w.Surely("OCIDescriptorFree", [&] { return OCIDescriptorFree(descriptor, OCI_DTYPE_TIMESTAMP); });
     w.Surely("OCIHandleFree of a statement", [&] { return OCIHandleFree(stmt, OCI_HTYPE_STMT); });
     w.Surely("OCILogoff", [&] { return OCILogoff(svc, static_cast<OCIError*>(err)); });
@@ -241,16 +245,37 @@ void ErrorTexts(World& w) {
     w.See(std::strstr(reinterpret_cast<const char*>(words), "missing") ? "named" : "not named");
 }
 
+// An error with words of its own: without memory for them there is a record all the same, and one only.
+void ErrorsWithWords(World& w) {
+    EXPECT_EQ(OCIFileInit(w.env, w.err), OCI_SUCCESS);
+    w.AtEnd([&w] { return OCIFileTerm(w.env, w.err); });
+    constexpr char kName[] = "/no/such/folder/and/a/name/that/is/longer/than/a/short/string";
+    OCIFileObject* file = nullptr;
+    try {
+        w.Step("OCIFileOpen", [&] {
+            return OCIFileOpen(w.env, w.err, &file, World::Text(kName), nullptr, OCI_FILE_READ_ONLY, OCI_FILE_EXIST,
+                               OCI_FILE_BIN);
+        }, Told::error_handle, 30152);
+    } catch (const Stopped&) {
+        EXPECT_EQ(OCIErrorGet(w.err, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
+        if (Seen().failed) throw;
+    }
+    std::string text;
+    w.See(World::Number(w.err, OCI_HTYPE_ERROR, &text));
+    w.See(text.find(kName) != std::string::npos ? "named" : text);
+}
+
 constexpr Scenario kScenarios[] = {
-    {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;"},
+    {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;", OCI_DEFAULT, true},
     {"FromNothingThreaded", Ground::nothing, nullptr, FromNothing, "abc;", OCI_THREADED | OCI_OBJECT},
     {"InitializeAndLogOn2", Ground::nothing, nullptr, InitializeAndLogOn2, "20;"},
-    {"FreeingTakesNoMemory", Ground::nothing, nullptr, FreeingTakesNoMemory, "freed;"},
+    {"FreeingTakesNoMemory", Ground::nothing, nullptr, FreeingTakesNoMemory, "freed;", OCI_DEFAULT, true},
     {"HandlesAndDescriptors", Ground::environment, nullptr, HandlesAndDescriptors, "made;"},
     {"AttachAndBegin", Ground::environment, nullptr, AttachAndBegin, "36;version;", OCI_UTF16},
     {"FirstLogon", Ground::environment, nullptr, FirstLogon, "1017;"},
     {"PasswordChange", Ground::environment, Account, PasswordChange, "changed;"},
     {"LogoffCommits", Ground::environment, nullptr, LogoffCommits, "1;"},
+    {"ErrorsWithWords", Ground::environment, nullptr, ErrorsWithWords, "30152;named;"},
     {"ErrorTexts", Ground::session, nullptr, ErrorTexts, "942;named;"},
 };
 

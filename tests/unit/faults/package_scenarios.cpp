@@ -1,8 +1,10 @@
 // Numbers, dates, strings and raws, files, threads.
-#include <cstdio>
+#include <atomic>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <thread>
 
 #include "faults/scenarios.h"
 
@@ -11,9 +13,9 @@ namespace {
 
 // ---- Numbers
 
-OCINumber Number(World& w, std::string_view text) {
+OCINumber Number(World& w, std::string_view text, std::string format = {}) {
     OCINumber number{};
-    const std::string format(text.size(), '9');
+    if (format.empty()) format.assign(text.size(), '9');
     w.Step("OCINumberFromText", [&] {
         return OCINumberFromText(w.err, World::Text(text), World::Size(text), World::Text(format), World::Size(format),
                                  nullptr, 0, &number);
@@ -50,13 +52,21 @@ void NumberFunctions(World& w) {
         w.Step("a number function", [&] { return function(w.err, &half, &result); });
         SeeNumber(w, result);
     }
+    // An argument whose last quarter turn takes 420 bits, a tie that takes all bits, and a result next to a tie.
+    const OCINumber huge = Number(w, "9.876E125", "9.999EEEE"), root = Number(w, "3.00000000000000000005"),
+                    two = Number(w, "2"), tiny = Number(w, "5E-39", "9EEEE");
+    OCINumber result{};
+    w.Step("OCINumberSin", [&] { return OCINumberSin(w.err, &huge, &result); });
+    SeeNumber(w, result);
+    w.Step("OCINumberPower", [&] { return OCINumberPower(w.err, &root, &two, &result); });
+    SeeNumber(w, result);
+    w.Step("OCINumberExp", [&] { return OCINumberExp(w.err, &tiny, &result); });
+    SeeNumber(w, result);
     using Binary = sword (*)(OCIError*, const OCINumber*, const OCINumber*, OCINumber*);
     for (const Binary function : {OCINumberPower, OCINumberLog, OCINumberArcTan2}) {
-        OCINumber result{};
         w.Step("a number function", [&] { return function(w.err, &large, &exponent, &result); });
         SeeNumber(w, result);
     }
-    OCINumber result{};
     w.Step("OCINumberIntPower", [&] { return OCINumberIntPower(w.err, &large, 17, &result); });
     SeeNumber(w, result);
 }
@@ -68,6 +78,12 @@ void NumberForms(World& w) {
     long double back = 0;
     w.Step("OCINumberToReal", [&] { return OCINumberToReal(w.err, &number, sizeof back, &back); });
     w.See(static_cast<long>(back * 10000));
+    w.Step("OCINumberFromReal", [&] { return OCINumberFromReal(w.err, &back, sizeof back, &number); });
+    OCINumber amount{};
+    w.Step("OCINumberFromText", [&] {
+        return OCINumberFromText(w.err, World::Text("$1,234.5"), 8, World::Text("$9,999.9"), 8, nullptr, 0, &amount);
+    });
+    SeeNumber(w, amount);
     for (const std::string_view format : {"L9G999D99", "TM9", "RN", "9.9EEEE", "FM0000V99", "XXXXXX"}) {
         OraText text[80] = "";
         ub4 size = sizeof text;
@@ -90,9 +106,13 @@ void Dates(World& w) {
     });
     w.Step("OCIDateNextDay", [&] { return OCIDateNextDay(w.err, &date, World::Text("MONDAY"), 6, &date); });
     w.Step("OCIDateAddMonths", [&] { return OCIDateAddMonths(w.err, &date, 11, &date); });
-    OCIDate now{};
+    OCIDate now{}, this_century{};
     w.Step("OCIDateSysDate", [&] { return OCIDateSysDate(w.err, &now); });
     EXPECT_GT(now.OCIDateYYYY, 2000);
+    w.Step("OCIDateFromText", [&] {
+        return OCIDateFromText(w.err, World::Text("29-FEB-24"), 9, World::Text("DD-MON-RR"), 9, nullptr, 0, &this_century);
+    });
+    w.See(this_century.OCIDateYYYY);
     OraText text[200] = "";
     ub4 size = sizeof text;
     constexpr std::string_view kFormat = "FMDay, DDTH \"of the month of\" Month YYYY, JSP, HH:MI:SS AM";
@@ -139,6 +159,35 @@ void Datetimes(World& w) {
     });
     w.See(hour);
 }
+
+// The zone of the process, which is read once.
+void ZoneOfTheProcess(World& w) {
+    auto* zoned = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
+    auto* plain = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
+    auto* local = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_LTZ);
+    const auto construct = [&](OCIDateTime* value, std::string_view zone) {
+        w.Step("OCIDateTimeConstruct", [&] {
+            return OCIDateTimeConstruct(w.env, w.err, value, 2024, 7, 15, 13, 14, 15, 5, World::Text(zone), zone.size());
+        });
+    };
+    OCIDate now{};
+    sword order = 0;
+    ub1 hour = 0, minute = 0, second = 0;
+    ub4 fraction = 0;
+    w.Step("OCIDateSysDate", [&] { return OCIDateSysDate(w.err, &now); });
+    construct(plain, "");
+    construct(zoned, "+05:30");
+    w.Step("OCIDateTimeCompare", [&] { return OCIDateTimeCompare(w.env, w.err, plain, zoned, &order); });
+    w.See(order);
+    w.Step("OCIDateTimeAssign", [&] { return OCIDateTimeAssign(w.env, w.err, zoned, local); });
+    w.Step("OCIDateTimeAssign", [&] { return OCIDateTimeAssign(w.env, w.err, plain, zoned); });
+    w.Step("OCIDateTimeGetTime", [&] {
+        return OCIDateTimeGetTime(w.env, w.err, zoned, &hour, &minute, &second, &fraction);
+    });
+    w.See(hour);
+}
+
+void InStJohns(World&) { setenv("TZ", ":America/St_Johns", 1); }
 
 // ---- Strings and raws
 
@@ -267,9 +316,14 @@ void Threads(World& w) {
     static int ran;
     ran = 0;
     // The system does not say whether it was memory or the number of threads: 21500 for both.
-    w.Step("OCIThreadCreate", [&] {
-        return OCIThreadCreate(w.env, w.err, [](dvoid* count) { ++*static_cast<int*>(count); }, &ran, id, handle);
-    }, Told::error_handle, 21500);
+    try {
+        w.Step("OCIThreadCreate", [&] {
+            return OCIThreadCreate(w.env, w.err, [](dvoid* count) { ++*static_cast<int*>(count); }, &ran, id, handle);
+        }, Told::error_handle, 21500);
+    } catch (const Stopped&) {
+        EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_ERROR) << "there is no thread";
+        throw;
+    }
     try {
         w.Step("OCIThreadJoin", [&] { return OCIThreadJoin(w.env, w.err, handle); });
     } catch (const Stopped&) {
@@ -281,23 +335,52 @@ void Threads(World& w) {
     w.See(ran);
 }
 
+// Many at once: those that find no memory for what a thread keeps look handles up and free them as others do.
+void ThreadsWithoutMemory(World& w) {
+    constexpr int kThreads = 4, kHandles = 100;
+    auto* const stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
+    std::vector<std::vector<dvoid*>> handles(kThreads, std::vector<dvoid*>(kHandles));
+    std::vector<OCIError*> errors(kThreads);
+    for (OCIError*& error : errors) error = w.New<OCIError>(OCI_HTYPE_ERROR);
+    for (auto& row : handles) {
+        for (dvoid*& handle : row) OCIHandleAlloc(w.env, &handle, OCI_HTYPE_TRANS, 0, nullptr);
+    }
+    std::atomic<int> wrong{0};
+    std::vector<std::thread> threads;
+    for (int index = 0; index < kThreads; ++index) {
+        threads.emplace_back([&, index] {
+            const Armed armed;
+            for (dvoid* handle : handles[index]) {
+                ub4 rows = 0;
+                wrong += OCIAttrGet(stmt, OCI_HTYPE_STMT, &rows, nullptr, OCI_ATTR_PREFETCH_ROWS, errors[index]) != 0;
+                wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_SUCCESS || rows != 1;
+                wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_INVALID_HANDLE;
+            }
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
+    w.See(wrong);
+}
+
 constexpr Scenario kScenarios[] = {
     {"NumberArithmetic", Ground::environment, nullptr, NumberArithmetic,
      "+1.234568E+19;+1.234568E+19;+1.219326E+28;+1.250000E+10;+1.774692E+08;"},
     {"NumberFunctions", Ground::environment, nullptr, NumberFunctions,
      "+5.000000E-01;+1.000000E+00;+0.000000E+00;-5.000000E-01;"
      "+1.047198E+00;+5.235988E-01;+4.636476E-01;+8.775826E-01;+1.648721E+00;+1.127626E+00;+5.210953E-01;"
-     "+4.621172E-01;-6.931472E-01;+4.794255E-01;+7.071068E-01;+5.463025E-01;+1.457013E+15;+4.113474E-01;"
-     "+1.512138E+00;+3.595071E+35;"},
+     "+4.621172E-01;-6.931472E-01;+4.794255E-01;+7.071068E-01;+5.463025E-01;-9.977082E-01;"
+     "+9.000000E+00;+1.000000E+00;+1.457013E+15;+4.113474E-01;+1.512138E+00;+3.595071E+35;"},
     {"NumberForms", Ground::environment, nullptr, NumberForms,
-     "12340625; EUR1.234,06;1234,0625;       MCCXXXIV; 1.2E+03;123406;    4D2;"},
+     "12340625;+1.234500E+03; EUR1.234,06;1234,0625;       MCCXXXIV; 1.2E+03;123406;    4D2;"},
     {"Dates", Ground::environment, nullptr, Dates,
-     "Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED SIXTY-SIX, "
+     "2024;Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED SIXTY-SIX, "
      "11:12:13 AM;"},
     {"Datetimes", Ground::environment, FindRegions, Datetimes, "-1;13;"},
+    {"ZoneOfTheProcess", Ground::environment, InStJohns, ZoneOfTheProcess, "1;13;", OCI_DEFAULT, true},
     {"Strings", Ground::environment, nullptr, Strings, "a text that is too long for the room of the first;"},
     {"Raws", Ground::environment, nullptr, Raws, "100;"},
     {"Files", Ground::environment, nullptr, Files, "20000;10;20001;"},
+    {"ThreadsWithoutMemory", Ground::environment, nullptr, ThreadsWithoutMemory, "0;", OCI_THREADED},
     {"Threads", Ground::environment, nullptr, Threads, "1;1;"},
 };
 

@@ -22,6 +22,8 @@ struct Stopped {};
 // Where a failing call says why: in an error handle's record, in the environment's, or in its return code alone.
 enum class Told { error_handle, environment, code };
 
+constexpr sb4 kOutOfMemory = 1019;
+
 // What is there before a scenario begins.
 enum class Ground { nothing, environment, session };
 
@@ -34,10 +36,11 @@ public:
 
     // ---- Steps
 
-    // Any call; `name` is for messages. OCI_ERROR must be memory's fault and told so, by 1019 or `also`; then Stopped
-    // is thrown.
+    // Any call; `name` is for messages. OCI_ERROR must be memory's fault and told so, by 1019 or, where
+    // another number is as good or what the call is for, by `also`; then Stopped is thrown.
     template <class Call>
-    sword Step(std::string_view name, Call call, Told told = Told::error_handle, sb4 also = 1019) {
+    sword Step(std::string_view name, Call call, Told told = Told::error_handle,
+               sb4 also = kOutOfMemory) {
         const sword code = Disturbed(call);
         if (code == OCI_ERROR) {
             CheckFailure(name, told, also);
@@ -171,6 +174,7 @@ struct Scenario {
     void (*run)(World&);        // its steps; what they show goes to `seen`
     const char* expected;       // what a run without failure has seen
     ub4 mode = OCI_DEFAULT;     // of the environment
+    bool first_calls = false;   // runs in new processes, too, where its steps are the first calls of all
 };
 
 }  // namespace faults

@@ -1,7 +1,4 @@
 // Executing: modes, counts, array changes and their failures, transactions, blocks.
-#include <algorithm>
-#include <cstdlib>
-
 #include "support/statement_fixture.h"
 
 namespace {
@@ -438,60 +435,6 @@ TEST_F(Executing, IndexTableArguments) {
     EXPECT_EQ(doubled[0], 3);
     count = 6;
     EXPECT_EQ(Bind(1, {numbers, 4, SQLT_INT}, OCI_DEFAULT, 5, &count), 1414);
-}
-
-// ---- Under pressure
-
-struct Budget {
-    int left;
-    static dvoid* Allocate(dvoid* self, std::size_t size) {
-        return static_cast<Budget*>(self)->left-- > 0 ? std::malloc(size) : nullptr;
-    }
-    static void Release(dvoid*, dvoid* memory) { std::free(memory); }
-};
-
-// The life of a statement in memory for `budget` blocks; whether it went well to the end.
-bool LiveWith(int blocks) {
-    Budget budget{blocks};
-    OCIEnv* env = nullptr;
-    const sword created =
-        OCIEnvCreate(&env, OCI_DEFAULT, &budget, Budget::Allocate, nullptr, Budget::Release, 0, nullptr);
-    if (created != OCI_SUCCESS) return false;
-    OCIError* err = nullptr;
-    OCISvcCtx* svc = nullptr;
-    OCIStmt* stmt = nullptr;
-    OCIStmt* cursor = nullptr;
-    OCIBind* bind = nullptr;
-    OCIDefine* define = nullptr;
-    dvoid* parameter = nullptr;
-    OCIString* string = nullptr;
-    const auto text = [](const char* chars) { return reinterpret_cast<const OraText*>(chars); };
-    const char* block = "begin open :c for select 'abc' from dual; end;";
-    const sword results[] = {
-        OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr),
-        OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, text(":memory:"), 8),
-        OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&stmt), OCI_HTYPE_STMT, 0, nullptr),
-        OCIStmtPrepare(stmt, err, text(block), static_cast<ub4>(std::strlen(block)), OCI_NTV_SYNTAX, OCI_DEFAULT),
-        OCIBindByPos(stmt, &bind, err, 1, &cursor, 8, SQLT_CUR, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT),
-        OCIStmtExecute(svc, stmt, err, 1, 0, nullptr, nullptr, OCI_DEFAULT),
-        OCIParamGet(cursor, OCI_HTYPE_STMT, err, &parameter, 1),
-        OCIDefineByPos(cursor, &define, err, 1, &string, 8, SQLT_VST, nullptr, nullptr, nullptr, OCI_DEFAULT),
-        OCIStmtFetch(cursor, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT),
-    };
-    OCILogoff(svc, err);
-    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-    return std::count(std::begin(results), std::end(results), OCI_SUCCESS) == std::ssize(results);
-}
-
-TEST(Memory, ThatFailsAtEachBlockInTurn) {
-    int blocks = 0;
-    while (!LiveWith(blocks) && blocks < 100) {
-        EXPECT_EQ(OCI_memGetMemCount(), 0) << blocks;
-        ++blocks;
-    }
-    EXPECT_GT(blocks, 5);
-    EXPECT_LT(blocks, 100);
-    EXPECT_EQ(OCI_memGetMemCount(), 0);
 }
 
 }  // namespace
