@@ -126,13 +126,12 @@ TEST_F(DateCalls, TextsInUtf16) {
 
 TEST_F(DateCalls, TypesHaveTheirParts) {
     const struct { ub4 type; const char* date; const char* time; } cases[] = {
-        {OCI_DTYPE_DATE, "2024-7-15", "1878"},
-        {OCI_DTYPE_TIME, "1878", "13:14:15.250000000"},
-        {OCI_DTYPE_TIME_TZ, "1878", "13:14:15.250000000"},
-        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.250000000"},
+        {OCI_DTYPE_DATE, "2024-7-15", "1878"}, {OCI_DTYPE_TIME, "1878", "13:14:15.250000000"},
+        {OCI_DTYPE_TIME_TZ, "1878", "13:14:15.250000000"}, {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.250000000"},
         {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.250000000"},
         {OCI_DTYPE_TIMESTAMP_LTZ, "2024-7-15", "13:14:15.250000000"},
-        {OCI_DTYPE_INTERVAL_YM, "2024-7-15", "13:14:15.250000000"}};    // the general type
+        {OCI_DTYPE_INTERVAL_YM, "2024-7-15", "13:14:15.250000000"},
+    };    // the general type
     for (const auto& c : cases) {
         OCIDateTime* value = NewDateTime(c.type);
         const bool has_date = std::string_view(c.date) != "1878", has_time = std::string_view(c.time) != "1878";

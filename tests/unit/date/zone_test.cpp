@@ -17,10 +17,10 @@ using namespace date;
 
 TEST(Zone, OffsetsByTheirText) {
     const struct { const char* zone; int minutes; Errno number; } cases[] = {
-        {"+05:30", 330, 0},        {"-08:00", -480, 0},       {"+5", 300, 0},           {"-00:30", -30, 0},
-        {"+14:00", 840, 0},        {"+14:01", 0, 1874}, {"-12:00", -720, 0},    {"-12:01", 0, 1874},
-        {"-13:00", 0, 1874}, {"+05:60", 0, 1875}, {"+", 0, 1857}, {"+a", 0, 1857},
-        {"+05:", 0, 1857},     {"+05:30x", 0, 1857},  {"+123", 0, 1857}};
+        {"+05:30", 330, 0},  {"-08:00", -480, 0}, {"+5", 300, 0},      {"-00:30", -30, 0},   {"+14:00", 840, 0},
+        {"+14:01", 0, 1874}, {"-12:00", -720, 0}, {"-12:01", 0, 1874}, {"-13:00", 0, 1874},  {"+05:60", 0, 1875},
+        {"+", 0, 1857},      {"+a", 0, 1857},     {"+05:", 0, 1857},   {"+05:30x", 0, 1857}, {"+123", 0, 1857},
+    };
     for (const auto& c : cases) {
         DateTime value = Read("2024-01-01");
         EXPECT_EQ(SetZone(c.zone, &value), c.number) << c.zone;
@@ -31,18 +31,15 @@ TEST(Zone, OffsetsByTheirText) {
 
 TEST(Zone, RegionsKnowTheirSeasons) {
     const struct { const char* value; const char* region; int minutes; const char* name; } cases[] = {
-        {"2024-01-15 12:00:00", "Europe/Paris", 60, "CET"},
-        {"2024-07-15 12:00:00", "Europe/Paris", 120, "CEST"},
+        {"2024-01-15 12:00:00", "Europe/Paris", 60, "CET"}, {"2024-07-15 12:00:00", "Europe/Paris", 120, "CEST"},
         {"2024-03-31 01:59:59", "Europe/Paris", 60, "CET"},
-        {"2024-03-31 02:30:00", "Europe/Paris", 60, "CEST"},     // skipped: the offset before it
+        {"2024-03-31 02:30:00", "Europe/Paris", 60, "CEST"},  // skipped: the offset before it
         {"2024-03-31 03:00:00", "Europe/Paris", 120, "CEST"},
-        {"2024-10-27 02:30:00", "Europe/Paris", 120, "CEST"},    // comes twice: the first
-        {"2024-10-27 03:00:00", "Europe/Paris", 60, "CET"},
-        {"2099-07-15 12:00:00", "America/New_York", -240, "EDT"},
-        {"2024-01-15 12:00:00", "Australia/Sydney", 660, "AEDT"},
-        {"2024-01-15 12:00:00", "Asia/Kolkata", 330, "IST"},
-        {"1890-01-15 12:00:00", "Europe/Berlin", 53, "LMT"},
-        {"2024-01-15 12:00:00", "UTC", 0, "UTC"}};
+        {"2024-10-27 02:30:00", "Europe/Paris", 120, "CEST"},  // comes twice: the first
+        {"2024-10-27 03:00:00", "Europe/Paris", 60, "CET"}, {"2099-07-15 12:00:00", "America/New_York", -240, "EDT"},
+        {"2024-01-15 12:00:00", "Australia/Sydney", 660, "AEDT"}, {"2024-01-15 12:00:00", "Asia/Kolkata", 330, "IST"},
+        {"1890-01-15 12:00:00", "Europe/Berlin", 53, "LMT"}, {"2024-01-15 12:00:00", "UTC", 0, "UTC"},
+    };
     for (const auto& c : cases) {
         DateTime value = Read(c.value);
         ASSERT_EQ(SetZone(c.region, &value), 0) << c.region;
@@ -139,16 +136,15 @@ TEST(ZoneRules, AgreeWithTheCLibrary) {
 
 TEST(ZoneRules, TextsOfRules) {
     const struct { const char* text; std::int64_t moment; int offset; const char* name; } cases[] = {
-        {"UTC0", 0, 0, "UTC"},
-        {"<+0330>-3:30", 0, 12600, "+0330"},
+        {"UTC0", 0, 0, "UTC"}, {"<+0330>-3:30", 0, 12600, "+0330"},
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846799, 3600, "CET"},
-        {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"},
-        {"EST5EDT", 1720000000, -14400, "EDT"},
+        {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"}, {"EST5EDT", 1720000000, -14400, "EDT"},
         {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
-        {"XXX3YYY2,J59/0,300/0", 1709089199, -10800, "XXX"},      // J59 is 28 February, in leap years too
+        {"XXX3YYY2,J59/0,300/0", 1709089199, -10800, "XXX"},  // J59 is 28 February, in leap years too
         {"XXX3YYY2,J59/0,300/0", 1709089200, -7200, "YYY"},
-        {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},      // J60 is 1 March in leap years, too
-        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"}};
+        {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},  // J60 is 1 March in leap years, too
+        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"},
+    };
     for (const auto& c : cases) {
         const auto rules = ZoneRules::FromText(c.text);
         ASSERT_TRUE(rules) << c.text;

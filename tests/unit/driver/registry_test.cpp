@@ -13,12 +13,7 @@ namespace {
 int object_a, object_b;  // stand for what the library returned
 
 TEST(Registry, CapacitiesAndMessages) {
-    const struct {
-        Kind kind;
-        int capacity;
-        const char* overflow;
-        const char* in_use;
-    } cases[] = {
+    const struct { Kind kind; int capacity; const char* overflow; const char* in_use; } cases[] = {
         {Kind::environment, 30, "Reached max environment handle count - 30\n",
          "*** Environment handle already in use\n"},
         {Kind::error, 30, "Reached max error handle count - 30\n", "*** Error handle already in use\n"},
@@ -97,10 +92,7 @@ TEST(Registry, ATakenSlotKeepsNothingOfTheFormerObject) {
 
 TEST(Registry, NamesAreCutToTheSlot) {
     const std::string long_name(40, 'n');
-    const struct {
-        Kind kind;
-        size_t kept;
-    } cases[] = {{Kind::stmt, 31}, {Kind::lob, 31}, {Kind::spool, 35}};
+    const struct { Kind kind; size_t kept; } cases[] = {{Kind::stmt, 31}, {Kind::lob, 31}, {Kind::spool, 35}};
     for (const auto& c : cases) {
         NamedObject* slot = Register(c.kind, long_name.c_str(), &object_a, nullptr);
         EXPECT_EQ(slot->name, long_name.substr(0, c.kept));
@@ -116,18 +108,11 @@ TEST(Registry, WordsThatStandForAPointer) {
     Register(Kind::error, "e1", &object_a, nullptr);
     Register(Kind::stmt, "s1", &object_b, nullptr);
     Register(Kind::stmt, "e1", &object_b, nullptr);  // names are unique within a kind only
-    const struct {
-        const char* word;
-        void* pointer;
-        const char* printed;
-    } cases[] = {
+    const struct { const char* word; void* pointer; const char* printed; } cases[] = {
         {"e1", &object_a, ""},
         {"s1", &object_b, ""},  // any kind may supply an error handle
-        {"E1", nullptr, "Handle E1 not found\n"},
-        {"NULL", nullptr, ""},
-        {"nulls", nullptr, "Handle nulls not found\n"},
-        {"-1", nullptr, "Handle -1 not found\n"},
-        {"Invalid", InvalidObject(), ""},
+        {"E1", nullptr, "Handle E1 not found\n"}, {"NULL", nullptr, ""}, {"nulls", nullptr, "Handle nulls not found\n"},
+        {"-1", nullptr, "Handle -1 not found\n"}, {"Invalid", InvalidObject(), ""},
     };
     for (const auto& c : cases)
         EXPECT_EQ(Printed([&] { EXPECT_EQ(ResolveErrorObject(c.word), c.pointer) << c.word; }), c.printed);
@@ -152,12 +137,7 @@ TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
     void* array[] = {&object_a, &object_b};
     AsRecord<Kind::lob>(Register(Kind::lob, "arr", array, nullptr))->array_count = 2;
     Register(Kind::lob, "one", &object_b, nullptr);
-    const struct {
-        const char* word;
-        void* object;
-        bool is_array;
-        long index;
-    } cases[] = {
+    const struct { const char* word; void* object; bool is_array; long index; } cases[] = {
         {"arr[0]", &object_a, false, 0},   {"arr[1]", &object_b, false, 1}, {"arr[2]", array, true, 2},
         {"arr", array, true, 0},           {"arr[-1]", array, true, -1},    {"arr[1x", &object_b, false, 1},
         {"arr[]", &object_a, false, 0},    {"one[5]", &object_b, false, 5}, {"one", &object_b, false, 0},

@@ -26,10 +26,7 @@ Code CodeOf(std::string function) {
 
 // Every line, by what follows the function's name when it is called for "x" and answers -7.
 TEST(Trace, TheLineOfEveryFunction) {
-    const struct {
-        const char* ending;
-        const char* functions;
-    } groups[] = {
+    const struct { const char* ending; const char* functions; } groups[] = {
         {"             OCI henv = x\n", "OCIEnvCreate OCIEnvInit xaoEnv"},
         {"             OCI hSvc = x\n",
          "OCILogoff OCILogon OCILogon2 OCISessionBegin OCISessionEnd OCITransCommit OCITransRollback OCIPing "
@@ -118,11 +115,10 @@ TEST(Commands, TheFirstRowThatTheWordBegins) {
         const char* word;
         int code;  // 0: none
     } cases[] = {
-        {"e", 76},           {"EXIT", 76},       {"ex", 76},         {"q", 76},          {"o", 50},
-        {"r", 77},           {"ocil", 203},      {"ocilogon", 206},  {"ocilogon2", 207}, {"OCIStmtFetch", 312},
-        {"ocistmtfetch2", 313}, {"sqll", 445},   {"sqlld2", 452},    {"xa", 368},        {"xar", 192},
-        {"ocithreadi", 389}, {"ocithreadisMULTI", 382}, {"olo", 414}, {"ologof", 415},   {"get", 448},
-        {"getm", 319},       {"exitx", 0},       {"", 0},            {"ocistmtexecutes", 0}, {"#", 0},
+        {"e", 76}, {"EXIT", 76}, {"ex", 76}, {"q", 76}, {"o", 50}, {"r", 77}, {"ocil", 203}, {"ocilogon", 206},
+        {"ocilogon2", 207}, {"OCIStmtFetch", 312}, {"ocistmtfetch2", 313}, {"sqll", 445}, {"sqlld2", 452}, {"xa", 368},
+        {"xar", 192}, {"ocithreadi", 389}, {"ocithreadisMULTI", 382}, {"olo", 414}, {"ologof", 415}, {"get", 448},
+        {"getm", 319}, {"exitx", 0}, {"", 0}, {"ocistmtexecutes", 0}, {"#", 0},
     };
     for (const auto& c : cases) {
         const Command* command = FindCommand(c.word);
@@ -157,20 +153,11 @@ TEST(CommandsDeathTest, AHandlerTableHasOnePlaceForEachCommand) {
 
 TEST(Diagnostics, TheServerTagIsTheSameForEveryServer) {
     const std::string longest(1100, 'x');
-    const struct {
-        std::string text, shown;
-    } cases[] = {
+    const struct { std::string text, shown; } cases[] = {
         {"[KELP/SQLITE] ORA-00942: no such table", "[KELP/OKRA64] ORA-00942: no such table"},
-        {"a [AS/400] b", "a [KELP/OKRA64] b"},
-        {"[PLOVR/VM]", "[KELP/OKRA64]"},
-        {"[AS][KELP/X]!", "[AS][KELP/OKRA64]!"},
-        {"]] [KELP", "]] [KELP"},
-        {"[KELP and no bracket", "[KELP and no bracket"},
-        {"[kelp] plain", "[kelp] plain"},
-        {"", ""},
-        {"one\r\n", "one\n"},
-        {"one\r\ntwo\r\n", "one\nttwo\r\n"},
-        {"one\rtwo\n", "one\rtwo\n"},
+        {"a [AS/400] b", "a [KELP/OKRA64] b"}, {"[PLOVR/VM]", "[KELP/OKRA64]"}, {"[AS][KELP/X]!", "[AS][KELP/OKRA64]!"},
+        {"]] [KELP", "]] [KELP"}, {"[KELP and no bracket", "[KELP and no bracket"}, {"[kelp] plain", "[kelp] plain"},
+        {"", ""}, {"one\r\n", "one\n"}, {"one\r\ntwo\r\n", "one\nttwo\r\n"}, {"one\rtwo\n", "one\rtwo\n"},
         {"[AS]" + longest, "[KELP/OKRA64]" + longest.substr(0, 1011)},
     };
     for (const auto& c : cases) EXPECT_EQ(NormaliseDiagnostic(c.text), c.shown) << c.text;

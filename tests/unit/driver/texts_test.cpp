@@ -47,16 +47,13 @@ TEST_F(Texts, ConvertToUtf16) {
         int result;
         std::string output, printed;
     } cases[] = {
-        {"abc", 3, 12, false, 0, Wide("abc"), Succeeded(3, 6)},
-        {"abc", 2, 12, true, 0, Wide("ab"), ""},
+        {"abc", 3, 12, false, 0, Wide("abc"), Succeeded(3, 6)}, {"abc", 2, 12, true, 0, Wide("ab"), ""},
         {"\xE4", 1, 4, true, 0, Wide("\xE4"), ""},  // the second code page stands in for UTF-8
         {"abc", 3, 4, false, static_cast<int>(0x870F00C0), Wide("ab"), Succeeded(3, 4)},
         {"W'abc'", 6, 24, true, 0, "abc", Succeeded(6, 3)},
         {"W'abc'", 5, 24, true, 0, Wide("W'abc"), ""},  // the length decides where the word ends
-        {"W'abc'", 6, 2, true, 0, "ab", Succeeded(6, 2)},
-        {"W''", 3, 12, false, 0, "", Succeeded(3, 0)},
-        {"W'", 2, 8, true, 0, Wide("W'"), ""},
-        {"", 0, 4, false, 0, "", ""},
+        {"W'abc'", 6, 2, true, 0, "ab", Succeeded(6, 2)},   {"W''", 3, 12, false, 0, "", Succeeded(3, 0)},
+        {"W'", 2, 8, true, 0, Wide("W'"), ""},              {"", 0, 4, false, 0, "", ""},
         {"abc", 3, 0, false, -1, "", "cbOutLen is zero\n"},
     };
     for (const auto& c : cases) {

@@ -12,10 +12,7 @@ namespace {
 
 using Words = std::vector<std::string>;
 
-struct Tokenized {
-    Words words;
-    std::string printed;
-};
+struct Tokenized { Words words; std::string printed; };
 
 // Tokenizes the line in a buffer that holds `left_over` from an earlier line.
 Tokenized Split(const std::string& line, const std::string& left_over = "") {
@@ -33,25 +30,13 @@ Tokenized Split(const std::string& line, const std::string& left_over = "") {
 const std::string kMissingQuote = "Parser warning: Missing end delimiter \"\"\"\n";
 
 TEST(Tokenizer, SplitsALine) {
-    const struct {
-        const char* line;
-        Words words;
-    } cases[] = {
+    const struct { const char* line; Words words; } cases[] = {
         {"OCIStmtPrepare stmt err \"select 1 from dual\"\n", {"OCIStmtPrepare", "stmt", "err", "select 1 from dual"}},
-        {"opt PRINTSQLFUNCTIONCODE#note\n", {"opt", "PRINTSQLFUNCTIONCODE"}},
-        {"a \"b c\"d e\n", {"a", "b c", "e"}},
-        {"a \"b # c\" d\n", {"a", "b # c", "d"}},
-        {"a \"b\"#c d\n", {"a", "b"}},
-        {"a \"b\"c#d e\n", {"a", "b"}},
-        {"\"\"\n", {""}},
-        {" \t a \t b \t\n", {"a", "b"}},
-        {"a b # c\n", {"a", "b"}},
-        {"a b\r\n", {"a", "b"}},
-        {"a\vb\n", {"a", "b"}},
-        {"a \v b\n", {"a", "", "b"}},
-        {"ab\"c d\"e\n", {"ab\"c", "d\"e"}},
-        {"no line end", {"no", "line", "end"}},
-        {"\xff\x80\x01 \xc3\xa4\n", {"\xff\x80\x01", "\xc3\xa4"}},
+        {"opt PRINTSQLFUNCTIONCODE#note\n", {"opt", "PRINTSQLFUNCTIONCODE"}}, {"a \"b c\"d e\n", {"a", "b c", "e"}},
+        {"a \"b # c\" d\n", {"a", "b # c", "d"}}, {"a \"b\"#c d\n", {"a", "b"}}, {"a \"b\"c#d e\n", {"a", "b"}},
+        {"\"\"\n", {""}}, {" \t a \t b \t\n", {"a", "b"}}, {"a b # c\n", {"a", "b"}}, {"a b\r\n", {"a", "b"}},
+        {"a\vb\n", {"a", "b"}}, {"a \v b\n", {"a", "", "b"}}, {"ab\"c d\"e\n", {"ab\"c", "d\"e"}},
+        {"no line end", {"no", "line", "end"}}, {"\xff\x80\x01 \xc3\xa4\n", {"\xff\x80\x01", "\xc3\xa4"}},
         {"a \"\" b\n", {"a", "", "b"}},
     };
     for (const auto& c : cases) {

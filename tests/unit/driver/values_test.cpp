@@ -46,38 +46,20 @@ struct Element {
 };
 
 TEST(Values, TextsStoredAndShown) {
-    const struct {
-        int type;
-        uint32_t size;
-        const char* word;
-        long given;
-        int length;
-        const char* shown;
-    } cases[] = {
-        {SQLT_CHR, 5, "abcde", 3, 3, "\"abc\"\n"},
-        {SQLT_CHR, 5, "abcdefgh", 8, 5, "\"abcde\"\n"},
-        {SQLT_CHR, 5, "abc", -1, 0, "\"\"\n"},
-        {SQLT_LNG, 5, "abc", 3, 3, "\"abc\"\n"},
-        {SQLT_STR, 5, "abcdefgh", 8, 4, "\"abcd\"\n"},
-        {SQLT_STR, 5, "ab", 100000, 4, "\"ab\"\n"},
-        {SQLT_STR, 0, "ab", 2, 0, "\"\"\n"},
-        {SQLT_AFC, 5, "ab", 2, 5, "\"ab   \"\n"},
-        {SQLT_VCS, 6, "abcdef", 3, 5, "\"abc\"\n"},
-        {SQLT_AVC, 6, "abcdef", 6, 6, "\"abcd\"\n"},
-        {SQLT_LVC, 8, "abcdef", 6, 8, "\"abcd\"\n"},
-        {SQLT_BIN, 5, "abc", 2, 2, "\"6162\"\n"},
-        {SQLT_BIN, 5, "X'01abFF'", 9, 3, "\"01ABFF\"\n"},
-        {SQLT_LBI, 5, "X'01abFF'", 2, 2, "\"01AB\"\n"},
-        {SQLT_VBI, 6, "X'01abFF'", 9, 5, "\"01ABFF\"\n"},
-        {SQLT_RID, 10, "X'01'", 5, 5, "\"5827303127\"\n"},
-        {SQLT_INT, 1, "-128", 4, 1, "-128\n"},
-        {SQLT_INT, 2, "32767", 1, 2, "32767\n"},
+    const struct { int type; uint32_t size; const char* word; long given; int length; const char* shown; } cases[] = {
+        {SQLT_CHR, 5, "abcde", 3, 3, "\"abc\"\n"}, {SQLT_CHR, 5, "abcdefgh", 8, 5, "\"abcde\"\n"},
+        {SQLT_CHR, 5, "abc", -1, 0, "\"\"\n"}, {SQLT_LNG, 5, "abc", 3, 3, "\"abc\"\n"},
+        {SQLT_STR, 5, "abcdefgh", 8, 4, "\"abcd\"\n"}, {SQLT_STR, 5, "ab", 100000, 4, "\"ab\"\n"},
+        {SQLT_STR, 0, "ab", 2, 0, "\"\"\n"}, {SQLT_AFC, 5, "ab", 2, 5, "\"ab   \"\n"},
+        {SQLT_VCS, 6, "abcdef", 3, 5, "\"abc\"\n"}, {SQLT_AVC, 6, "abcdef", 6, 6, "\"abcd\"\n"},
+        {SQLT_LVC, 8, "abcdef", 6, 8, "\"abcd\"\n"}, {SQLT_BIN, 5, "abc", 2, 2, "\"6162\"\n"},
+        {SQLT_BIN, 5, "X'01abFF'", 9, 3, "\"01ABFF\"\n"}, {SQLT_LBI, 5, "X'01abFF'", 2, 2, "\"01AB\"\n"},
+        {SQLT_VBI, 6, "X'01abFF'", 9, 5, "\"01ABFF\"\n"}, {SQLT_RID, 10, "X'01'", 5, 5, "\"5827303127\"\n"},
+        {SQLT_INT, 1, "-128", 4, 1, "-128\n"}, {SQLT_INT, 2, "32767", 1, 2, "32767\n"},
         {SQLT_INT, 4, "-2147483648", 4, 4, "-2147483648\n"},
         {SQLT_INT, 8, "+9223372036854775807", 8, 8, "9223372036854775807\n"},
-        {SQLT_UIN, 8, "18446744073709551615", 8, 8, "18446744073709551615\n"},
-        {SQLT_UIN, 3, "65535", 3, 3, "65535\n"},
-        {SQLT_FLT, 4, "1.5", 4, 4, "1.500000\n"},
-        {SQLT_FLT, 8, "-1e3", 8, 8, "-1000.000000\n"},
+        {SQLT_UIN, 8, "18446744073709551615", 8, 8, "18446744073709551615\n"}, {SQLT_UIN, 3, "65535", 3, 3, "65535\n"},
+        {SQLT_FLT, 4, "1.5", 4, 4, "1.500000\n"}, {SQLT_FLT, 8, "-1e3", 8, 8, "-1000.000000\n"},
         {SQLT_FLT, 16, "0.25", 16, 16, "0.250000\n"},
         {SQLT_DAT, 7, "2024-02-29-13:05:00", 7, 7, "\"2024-02-29-13:05:00\"\n"},
         {SQLT_DAT, 7, "2023-02-29-13:05:00", 7, 7, "Invalid date found\n"},
@@ -95,11 +77,7 @@ TEST(Values, TextsStoredAndShown) {
 }
 
 TEST(Values, AWordThatIsNoValueChangesNothing) {
-    const struct {
-        int type;
-        uint32_t size;
-        const char* word;
-    } cases[] = {
+    const struct { int type; uint32_t size; const char* word; } cases[] = {
         {SQLT_INT, 1, "128"},      {SQLT_INT, 4, "12x"},         {SQLT_INT, 4, ""},
         {SQLT_UIN, 4, "-1"},       {SQLT_FLT, 8, "one"},         {SQLT_FLT, 2, "1"},
         {SQLT_BIN, 5, "X'0'"},     {SQLT_VBI, 8, "X'0G'"},       {SQLT_DAT, 7, "yesterday"},
@@ -147,11 +125,7 @@ TEST(Values, WhatFollowsTheFrame) {
 
 // Lengths that the library returned, or prefixes in the data, may say more than there is.
 TEST(Values, LengthsAreNotFollowedPastTheElement) {
-    const struct {
-        int type;
-        uint32_t size;
-        const char* shown;
-    } cases[] = {
+    const struct { int type; uint32_t size; const char* shown; } cases[] = {
         {SQLT_CHR, 2, "\"\xFF\xFF\"\n"},     {SQLT_STR, 2, "\"\xFF\xFF\"\n"}, {SQLT_BIN, 2, "\"FFFF\"\n"},
         {SQLT_VCS, 4, "\"\xFF\xFF\"\n"},     {SQLT_VCS, 1, "\"\"\n"},         {SQLT_VBI, 3, "\"FF\"\n"},
         {SQLT_LVC, 6, "\"\"\n"},             {SQLT_FLT, 2, "0.000000\n"},     {SQLT_DAT, 7, "Invalid date found\n"},
@@ -168,19 +142,10 @@ TEST(Values, LengthsAreNotFollowedPastTheElement) {
 }
 
 TEST(Values, PackedDecimalsShown) {
-    const struct {
-        std::string bytes;
-        uint16_t precision;
-        int16_t scale;
-        const char* shown;
-    } cases[] = {
-        {"\x12\x34\x5D", 5, 2, "-123.45\n"},
-        {"\x12\x34\x5D", 5, 5, "-0.12345\n"},
-        {"\x12\x34\x5D", 5, 7, "-0.0012345\n"},
-        {"\x12\x34\x5D", 5, -3, "-12345000\n"},
-        {"\x9D", 1, 1, "-0.9\n"},
-        {"\x9D", 1, 0, "-9\n"},
-        {std::string("\0\0\x0D", 3), 5, 5, "0.00000\n"},
+    const struct { std::string bytes; uint16_t precision; int16_t scale; const char* shown; } cases[] = {
+        {"\x12\x34\x5D", 5, 2, "-123.45\n"}, {"\x12\x34\x5D", 5, 5, "-0.12345\n"},
+        {"\x12\x34\x5D", 5, 7, "-0.0012345\n"}, {"\x12\x34\x5D", 5, -3, "-12345000\n"}, {"\x9D", 1, 1, "-0.9\n"},
+        {"\x9D", 1, 0, "-9\n"}, {std::string("\0\0\x0D", 3), 5, 5, "0.00000\n"},
         {"\x12\x34\x51", 5, 2, "DecimalToText failed with rc - 2\n\n"},
         {"\x12\xA4\x5C", 5, 2, "DecimalToText failed with rc - 1\n12\n"},
         // The precision speaks of more bytes than the element has.
@@ -200,26 +165,16 @@ TEST(Values, PackedDecimalsShown) {
 
 // The first and the last of each field, and the next beyond.
 TEST(Values, SevenByteDatesThatArePossible) {
-    const struct {
-        unsigned char bytes[7];
-        const char* shown;
-    } cases[] = {
-        {{100, 101, 1, 1, 1, 1, 1}, "\"0001-01-01-00:00:00\"\n"},
-        {{100, 100, 1, 1, 1, 1, 1}, "Invalid date found\n"},
+    const struct { unsigned char bytes[7]; const char* shown; } cases[] = {
+        {{100, 101, 1, 1, 1, 1, 1}, "\"0001-01-01-00:00:00\"\n"}, {{100, 100, 1, 1, 1, 1, 1}, "Invalid date found\n"},
         {{100, 99, 12, 31, 24, 60, 60}, "\"-001-12-31-23:59:59\"\n"},
         {{199, 199, 12, 31, 24, 60, 60}, "\"9999-12-31-23:59:59\"\n"},
-        {{200, 100, 1, 1, 1, 1, 1}, "Invalid date found\n"},
-        {{53, 88, 1, 1, 1, 1, 1}, "\"-4712-01-01-00:00:00\"\n"},
-        {{53, 87, 1, 1, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 0, 1, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 13, 1, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 1, 0, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 4, 31, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 1, 1, 0, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 1, 1, 25, 1, 1}, "Invalid date found\n"},
-        {{120, 124, 1, 1, 1, 61, 1}, "Invalid date found\n"},
-        {{120, 124, 1, 1, 1, 1, 61}, "Invalid date found\n"},
-        {{119, 100, 2, 29, 1, 1, 1}, "Invalid date found\n"},
+        {{200, 100, 1, 1, 1, 1, 1}, "Invalid date found\n"}, {{53, 88, 1, 1, 1, 1, 1}, "\"-4712-01-01-00:00:00\"\n"},
+        {{53, 87, 1, 1, 1, 1, 1}, "Invalid date found\n"}, {{120, 124, 0, 1, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 13, 1, 1, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 0, 1, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 4, 31, 1, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 0, 1, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 1, 25, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 1, 61, 1}, "Invalid date found\n"},
+        {{120, 124, 1, 1, 1, 1, 61}, "Invalid date found\n"}, {{119, 100, 2, 29, 1, 1, 1}, "Invalid date found\n"},
         {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"},
     };
     for (const auto& c : cases) {
@@ -246,22 +201,10 @@ TEST(Values, FreeingABufferGivesBackEveryBlock) {
 }
 
 TEST(Values, ElementSizesByType) {
-    const struct {
-        const char* types;
-        uint32_t given, size;
-    } cases[] = {
-        {"sqlt_num sqlt_vnu", 100, 22},
-        {"sqlt_int", 8, 8},
-        {"sqlt_int", 3, 4},
-        {"sqlt_flt", 4, 4},
-        {"sqlt_flt", 16, 16},
-        {"sqlt_flt", 2, 8},
-        {"sqlt_vcs sqlt_vbi sqlt_avc", 10, 12},
-        {"sqlt_lvc", 10, 14},
-        {"sqlt_rid", 99, 10},
-        {"sqlt_dat", 99, 7},
-        {"sqlt_bfloat", 99, 8},
-        {"sqlt_bdouble", 99, 16},
+    const struct { const char* types; uint32_t given, size; } cases[] = {
+        {"sqlt_num sqlt_vnu", 100, 22}, {"sqlt_int", 8, 8}, {"sqlt_int", 3, 4}, {"sqlt_flt", 4, 4},
+        {"sqlt_flt", 16, 16}, {"sqlt_flt", 2, 8}, {"sqlt_vcs sqlt_vbi sqlt_avc", 10, 12}, {"sqlt_lvc", 10, 14},
+        {"sqlt_rid", 99, 10}, {"sqlt_dat", 99, 7}, {"sqlt_bfloat", 99, 8}, {"sqlt_bdouble", 99, 16},
         {"sqlt_lvb sqlt_cur sqlt_rdd sqlt_clob sqlt_blob sqlt_rset sqlt_vst sqlt_odt sqlt_date", 99, 8},
         {"sqlt_timestamp sqlt_timestamp_tz sqlt_timestamp_ltz", 99, 8},
         {"sqlt_chr sqlt_str sqlt_lng sqlt_bin sqlt_lbi sqlt_uin sqlt_afc sqlt_time sqlt_time_tz", 3, 3},

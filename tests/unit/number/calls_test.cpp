@@ -60,18 +60,15 @@ TEST_P(NumberCalls, MissingHandlesAndPointers) {
     EXPECT_EQ(OCINumberAdd(nullptr, &one, &one, &result), OCI_INVALID_HANDLE);
     EXPECT_EQ(OCINumberAdd(reinterpret_cast<OCIError*>(memory), &one, &one, &result), OCI_INVALID_HANDLE);
     EXPECT_EQ(OCINumberSin(nullptr, nullptr, nullptr), OCI_INVALID_HANDLE);
-    const sword codes[] = {OCINumberAdd(error_, nullptr, &one, &result),
-                           OCINumberAdd(error_, &one, &one, nullptr),
-                           OCINumberSqrt(error_, nullptr, &result),
-                           OCINumberInc(error_, nullptr),
-                           OCINumberSign(error_, &one, nullptr),
-                           OCINumberCmp(error_, &one, nullptr, nullptr),
-                           OCINumberFromInt(error_, nullptr, 4, OCI_NUMBER_SIGNED, &result),
-                           OCINumberToReal(error_, &one, 8, nullptr),
-                           OCINumberToReal(error_, &one, 0, memory),
-                           OCINumberToRealArray(error_, nullptr, 3, 8, memory),
-                           OCINumberFromText(error_, nullptr, 5, nullptr, 0, nullptr, 0, &result),
-                           OCINumberToText(error_, &one, nullptr, 0, nullptr, 0, nullptr, nullptr)};
+    const sword codes[] = {
+        OCINumberAdd(error_, nullptr, &one, &result), OCINumberAdd(error_, &one, &one, nullptr),
+        OCINumberSqrt(error_, nullptr, &result), OCINumberInc(error_, nullptr), OCINumberSign(error_, &one, nullptr),
+        OCINumberCmp(error_, &one, nullptr, nullptr), OCINumberFromInt(error_, nullptr, 4, OCI_NUMBER_SIGNED, &result),
+        OCINumberToReal(error_, &one, 8, nullptr), OCINumberToReal(error_, &one, 0, memory),
+        OCINumberToRealArray(error_, nullptr, 3, 8, memory),
+        OCINumberFromText(error_, nullptr, 5, nullptr, 0, nullptr, 0, &result),
+        OCINumberToText(error_, &one, nullptr, 0, nullptr, 0, nullptr, nullptr),
+    };
     for (const sword code : codes) EXPECT_EQ(code, OCI_ERROR);
     EXPECT_EQ(Recorded(), 21560);
     OCINumberSetZero(nullptr, &result);

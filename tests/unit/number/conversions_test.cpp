@@ -55,17 +55,10 @@ TEST(NumberIntegers, WhatNoIntegerHolds) {
 }
 
 TEST(NumberReals, ShortestDecimalOfTheReal) {
-    const struct {
-        double value;
-        const char* number;
-    } cases[] = {{0.1, "0.1"},
-                 {-2.5e-5, "-0.000025"},
-                 {1e23, "1E23"},
-                 {5e-130, "5E-130"},
-                 {0.0, "0"},
-                 {-0.0, "0"},
-                 {123456789012345680.0, "123456789012345680"},
-                 {1.0 / 3, "0.3333333333333333"}};
+    const struct { double value; const char* number; } cases[] = {
+        {0.1, "0.1"}, {-2.5e-5, "-0.000025"}, {1e23, "1E23"}, {5e-130, "5E-130"}, {0.0, "0"}, {-0.0, "0"},
+        {123456789012345680.0, "123456789012345680"}, {1.0 / 3, "0.3333333333333333"},
+    };
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::FromDouble(c.value, &got), 0) << c.value;
@@ -123,36 +116,14 @@ TEST(NumberReals, ThereAndBackThroughEveryWidth) {
 
 TEST(NumberPlainText, Reads) {
     const std::string long_fraction = "0." + std::string(9000, '0') + "1", long_whole(9000, '7');
-    const struct {
-        std::string_view text;
-        number::Errno error;
-        const char* number;
-    } cases[] = {{"  +1.50 ", 0, "1.5"},
-                 {".5", 0, "0.5"},
-                 {"5.", 0, "5"},
-                 {"-0", 0, "0"},
-                 {"1e3", 0, "1000"},
-                 {"1E-3", 0, "0.001"},
-                 {"00012", 0, "12"},
-                 {"0e999999999999", 0, "0"},
-                 {"1e-999999999999", 0, "0"},
-                 {long_fraction, 0, "0"},
-                 {"99999999999999999999999999999999999999995", 0, "1E41"},
-                 {"", 1722, ""},
-                 {" ", 1722, ""},
-                 {".", 1722, ""},
-                 {"-", 1722, ""},
-                 {"1e", 1722, ""},
-                 {"1e+", 1722, ""},
-                 {"1.2.3", 1722, ""},
-                 {"1 2", 1722, ""},
-                 {"--1", 1722, ""},
-                 {"1x", 1722, ""},
-                 {"1,5", 1722, ""},
-                 {"0x10", 1722, ""},
-                 {"1e126", 1426, ""},
-                 {"1e999999999999", 1426, ""},
-                 {long_whole, 1426, ""}};
+    const struct { std::string_view text; number::Errno error; const char* number; } cases[] = {
+        {"  +1.50 ", 0, "1.5"}, {".5", 0, "0.5"}, {"5.", 0, "5"}, {"-0", 0, "0"}, {"1e3", 0, "1000"},
+        {"1E-3", 0, "0.001"}, {"00012", 0, "12"}, {"0e999999999999", 0, "0"}, {"1e-999999999999", 0, "0"},
+        {long_fraction, 0, "0"}, {"99999999999999999999999999999999999999995", 0, "1E41"}, {"", 1722, ""},
+        {" ", 1722, ""}, {".", 1722, ""}, {"-", 1722, ""}, {"1e", 1722, ""}, {"1e+", 1722, ""}, {"1.2.3", 1722, ""},
+        {"1 2", 1722, ""}, {"--1", 1722, ""}, {"1x", 1722, ""}, {"1,5", 1722, ""}, {"0x10", 1722, ""},
+        {"1e126", 1426, ""}, {"1e999999999999", 1426, ""}, {long_whole, 1426, ""},
+    };
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::FromPlainText(c.text, '.', &got), c.error) << c.text.substr(0, 50);
@@ -166,19 +137,12 @@ TEST(NumberPlainText, Reads) {
 }
 
 TEST(NumberPlainText, Writes) {
-    const struct {
-        const char* number;
-        const char* text;
-    } cases[] = {{"0", "0"},
-                 {"-0.5", "-.5"},
-                 {"1200", "1200"},
-                 {"0.001", ".001"},
-                 {"1E39", "1000000000000000000000000000000000000000"},
-                 {"1E40", "1E+40"},
-                 {"1E-40", ".0000000000000000000000000000000000000001"},
-                 {"1E-41", "1E-41"},
-                 {"-1.5E100", "-1.5E+100"},
-                 {"-123456789012345678901234567890.1234567890", "-123456789012345678901234567890.123456789"}};
+    const struct { const char* number; const char* text; } cases[] = {
+        {"0", "0"}, {"-0.5", "-.5"}, {"1200", "1200"}, {"0.001", ".001"},
+        {"1E39", "1000000000000000000000000000000000000000"}, {"1E40", "1E+40"},
+        {"1E-40", ".0000000000000000000000000000000000000001"}, {"1E-41", "1E-41"}, {"-1.5E100", "-1.5E+100"},
+        {"-123456789012345678901234567890.1234567890", "-123456789012345678901234567890.123456789"},
+    };
     for (const auto& c : cases) EXPECT_EQ(Shown(Number(c.number)), c.text);
     RandomNumbers numbers(22);
     for (int i = 0; i < 2000; ++i) {
@@ -188,17 +152,12 @@ TEST(NumberPlainText, Writes) {
 }
 
 TEST(NumberDecimalFloat, KnownBytes) {
-    const struct {
-        const char* number;
-        std::size_t size;
-        std::uint64_t high, low;
-    } cases[] = {{"1", 8, 0, 0x31C0000000000001},
-                 {"-7.5", 8, 0, 0xB1A000000000004B},
-                 {"9999999999999999", 8, 0, 0x6C7386F26FC0FFFF},
-                 {"0", 8, 0, 0x31C0000000000000},
-                 {"1", 16, 0x3040000000000000, 1},
-                 {"-1E-130", 16, 0xAF3C000000000000, 1},
-                 {"9999999999999999999999999999999999", 16, 0x3041ED09BEAD87C0, 0x378D8E63FFFFFFFF}};
+    const struct { const char* number; std::size_t size; std::uint64_t high, low; } cases[] = {
+        {"1", 8, 0, 0x31C0000000000001}, {"-7.5", 8, 0, 0xB1A000000000004B},
+        {"9999999999999999", 8, 0, 0x6C7386F26FC0FFFF}, {"0", 8, 0, 0x31C0000000000000},
+        {"1", 16, 0x3040000000000000, 1}, {"-1E-130", 16, 0xAF3C000000000000, 1},
+        {"9999999999999999999999999999999999", 16, 0x3041ED09BEAD87C0, 0x378D8E63FFFFFFFF},
+    };
     for (const auto& c : cases) {
         std::uint64_t words[2] = {};
         OCINumber back;
@@ -216,10 +175,7 @@ TEST(NumberDecimalFloat, RoundsToItsDigitsAndRefusesWhatIsNoNumber) {
     ASSERT_EQ(number::ToDecimalFloat(Number("0.12345678901234565"), 8, words), 0);
     ASSERT_EQ(number::FromDecimalFloat(words, 8, &got), 0);
     EXPECT_EQ(got, Number("0.1234567890123457"));
-    const struct {
-        std::uint64_t bits;
-        number::Errno error;
-    } special[] = {{0x7800000000000000, 22053},   // infinity
+    const struct { std::uint64_t bits; number::Errno error; } special[] = {{0x7800000000000000, 22053},   // infinity
                    {0x7C00000000000000, 22060},  // NaN
                    {0x5FE0000000000001, 22053},   // 1E369
                    {0x0000000000000001, 22054},  // 1E-398

@@ -150,29 +150,16 @@ TEST(NumberFunctions, FunctionsOfTwoNumbers) {
 }
 
 TEST(NumberFunctions, PowersThatAreExact) {
-    const struct {
-        const char* base;
-        const char* exponent;
-        const char* result;
-    } cases[] = {{"2", "10", "1024"},
-                 {"2", "-3", "0.125"},
-                 {"4", "0.5", "2"},
-                 {"0.25", "-1.5", "8"},
-                 {"-2", "3", "-8"},
-                 {"-2", "4", "16"},
-                 {"0", "0", "1"},
-                 {"0", "2.5", "0"},
-                 {"7", "0", "1"},
-                 {"10", "-130", "1E-130"},
-                 {"10", "125", "1E125"},
-                 {"1", "1E125", "1"},
-                 {"-1", "1E125", "1"},
-                 {"-1", "-7", "-1"},
-                 {"9.5367431640625E-7", "0.05", "0.5"},
-                 // Exact ties, rounded away from zero: 41 digits with a 5 at the end.
-                 {"1.00000000000000000005", "2", "1.0000000000000000001"},
-                 {"-3.00000000000000000005", "2", "9.0000000000000000003"},
-                 {"1.0000000000000000001000000000000000000025", "0.5", "1.00000000000000000005"}};
+    const struct { const char* base; const char* exponent; const char* result; } cases[] = {
+        {"2", "10", "1024"},  {"2", "-3", "0.125"},     {"4", "0.5", "2"},                     {"0.25", "-1.5", "8"},
+        {"-2", "3", "-8"},    {"-2", "4", "16"},        {"0", "0", "1"},                       {"0", "2.5", "0"},
+        {"7", "0", "1"},      {"10", "-130", "1E-130"}, {"10", "125", "1E125"},                {"1", "1E125", "1"},
+        {"-1", "1E125", "1"}, {"-1", "-7", "-1"},       {"9.5367431640625E-7", "0.05", "0.5"},
+        // Exact ties, rounded away from zero: 41 digits with a 5 at the end.
+        {"1.00000000000000000005", "2", "1.0000000000000000001"},
+        {"-3.00000000000000000005", "2", "9.0000000000000000003"},
+        {"1.0000000000000000001000000000000000000025", "0.5", "1.00000000000000000005"},
+    };
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::Power(Number(c.base), Number(c.exponent), &got), 0) << c.base << " " << c.exponent;
@@ -187,12 +174,7 @@ TEST(NumberFunctions, PowersThatAreExact) {
 }
 
 TEST(NumberFunctions, OutsideTheDomain) {
-    const struct {
-        number::Binary function;
-        const char* left;
-        const char* right;
-        number::Errno error;
-    } cases[] = {
+    const struct { number::Binary function; const char* left; const char* right; number::Errno error; } cases[] = {
         {number::Power, "0", "-1", 22056}, {number::Power, "-2", "0.5", 22060},
         {number::Log, "1", "5", 22060},        {number::Log, "0", "5", 22060},
         {number::Log, "-2", "5", 22060},       {number::Log, "2", "0", 22060},

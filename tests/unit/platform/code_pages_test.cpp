@@ -11,11 +11,7 @@ namespace {
 
 using namespace std::string_literals;
 
-struct Converted {
-    int result;
-    std::string output;
-    std::size_t unused_input;
-};
+struct Converted { int result; std::string output; std::size_t unused_input; };
 
 // Converts into an area of just this capacity: the sanitizers see a byte too far.
 Converted Convert(unsigned source, unsigned target, const std::string& input, std::size_t capacity = 256) {
@@ -55,14 +51,13 @@ TEST(CodePages, KnownBytesBothWays) {
 // However short the area: no half character, and what was read is just what was written.
 TEST(CodePages, AreasOfEveryLength) {
     const struct { unsigned source; unsigned target; std::string input; } cases[] = {
-        {1208, 1202, "aé中𝄞b"},      {1202, 1208, Convert(1208, 1202, "aé中𝄞b").output},
-        {1208, 1208, "aé中𝄞b"},      {1208, 54936, "aé中𝄞b"},
-        {54936, 1200, Convert(1208, 54936, "aé中𝄞b").output},
-        {943, 1208, "a\x82\xA0\xB1z"}, {1202, 943, Convert(943, 1202, "a\x82\xA0\xB1z").output},
-        {1258, 1208, "xe\xEC" "e\xEC" "ae"},    // each e but the last is joined by its accent
-        {1258, 1202, "xe\xEC" "ae\xEC"},        {1208, 37, "abcé"},
-        {1208, 819, "a中"},                      {1208, 943, "é中é"},  // substitutes that just fit
-        {1208, 1202, "a\xFFz\xE4\xB8"},         {1202, 850, Convert(1208, 1202, "aй中z").output},
+        {1208, 1202, "aé中𝄞b"}, {1202, 1208, Convert(1208, 1202, "aé中𝄞b").output}, {1208, 1208, "aé中𝄞b"},
+        {1208, 54936, "aé中𝄞b"}, {54936, 1200, Convert(1208, 54936, "aé中𝄞b").output}, {943, 1208, "a\x82\xA0\xB1z"},
+        {1202, 943, Convert(943, 1202, "a\x82\xA0\xB1z").output},
+        {1258, 1208, "xe\xEC" "e\xEC" "ae"},  // each e but the last is joined by its accent
+        {1258, 1202, "xe\xEC" "ae\xEC"}, {1208, 37, "abcé"}, {1208, 819, "a中"},
+        {1208, 943, "é中é"},  // substitutes that just fit
+        {1208, 1202, "a\xFFz\xE4\xB8"}, {1202, 850, Convert(1208, 1202, "aй中z").output},
     };
     for (const auto& c : cases) {
         const Converted whole = Convert(c.source, c.target, c.input);
@@ -82,16 +77,13 @@ TEST(CodePages, AreasOfEveryLength) {
 
 TEST(CodePages, WhatCannotBeConverted) {
     const struct { unsigned source; unsigned target; std::string input; std::string output; } cases[] = {
-        {1208, 819, "a中b", "a?b"},                  {1208, 37, "中", "\x6F"},
-        {1208, 943, "é", "?"},                       {1202, 850, "\x34\xD8\x1E\xDD" "a\0"s, "?a"},
-        {1208, 1202, "a\xFF", "a\0\xFD\xFF"s},       {1208, 1202, "\xC0\x80", "\xFD\xFF\xFD\xFF"},
-        {1208, 1202, "\xED\xA0\x80", "\xFD\xFF\xFD\xFF\xFD\xFF"},
+        {1208, 819, "a中b", "a?b"}, {1208, 37, "中", "\x6F"}, {1208, 943, "é", "?"},
+        {1202, 850, "\x34\xD8\x1E\xDD" "a\0"s, "?a"}, {1208, 1202, "a\xFF", "a\0\xFD\xFF"s},
+        {1208, 1202, "\xC0\x80", "\xFD\xFF\xFD\xFF"}, {1208, 1202, "\xED\xA0\x80", "\xFD\xFF\xFD\xFF\xFD\xFF"},
         {1208, 1202, "\xF4\x90\x80\x80", "\xFD\xFF\xFD\xFF\xFD\xFF\xFD\xFF"},
-        {1208, 1202, "é\xE4\xB8", "\xE9\0\xFD\xFF\xFD\xFF"s},
-        {1202, 1208, "\x34\xD8" "a\0"s, "\uFFFD" "a"}, {1202, 1208, "\x1E\xDD", "\uFFFD"},
-        {1202, 1208, "a\0b"s, "a\uFFFD"},            {1202, 819, "a\0b"s, "a?"},
-        {1200, 1208, "\xD8\x34", "\uFFFD"},          {1208, 13488, "𝄞", "\xFF\xFD"},
-        {943, 1208, "a\x82", "a\uFFFD"},
+        {1208, 1202, "é\xE4\xB8", "\xE9\0\xFD\xFF\xFD\xFF"s}, {1202, 1208, "\x34\xD8" "a\0"s, "\uFFFD" "a"},
+        {1202, 1208, "\x1E\xDD", "\uFFFD"}, {1202, 1208, "a\0b"s, "a\uFFFD"}, {1202, 819, "a\0b"s, "a?"},
+        {1200, 1208, "\xD8\x34", "\uFFFD"}, {1208, 13488, "𝄞", "\xFF\xFD"}, {943, 1208, "a\x82", "a\uFFFD"},
     };
     for (const auto& c : cases) {
         const Converted converted = Convert(c.source, c.target, c.input);

@@ -98,14 +98,11 @@ TEST(SqlText, KindOfStatement) {
 TEST(SqlText, PlaceholdersOutsideOfQuotesAndComments) {
     const struct { const char* text; const char* names; } cases[] = {
         {"select :a, ':b', \":c\", q'[:d']' /* :e */ from t -- :f\n where x = :1", "A 1"},
-        {"insert into t values(?, ?, :x)", "1 2 X"},
-        {"select :name, :NAME, :\"name\"", "NAME +NAME name"},
-        {"insert into t values(:a:ind, :b)", "A/IND B"},
-        {"select 'it''s :a', x::text, :b::text", "B"},
+        {"insert into t values(?, ?, :x)", "1 2 X"}, {"select :name, :NAME, :\"name\"", "NAME +NAME name"},
+        {"insert into t values(:a:ind, :b)", "A/IND B"}, {"select 'it''s :a', x::text, :b::text", "B"},
         {"select * from t where rowid = :r and :s < t.rowid and rowid in (:u, 'x', :v) and a = :w", "@R @S @U @V W"},
         {"select :\xc3\xa4rger", "\xc3\xa4RGER"},
-        {"create trigger g after insert on t begin insert into l values(:new.a); end;", ""},
-        {"select : a", ""},
+        {"create trigger g after insert on t begin insert into l values(:new.a); end;", ""}, {"select : a", ""},
     };
     for (const auto& c : cases) EXPECT_EQ(Names(sql::Scan(c.text)), c.names) << c.text;
 }
@@ -145,28 +142,13 @@ TEST(SqlText, ReturningInto) {
 
 TEST(SqlText, WhatTheTextTellsToBeWrong) {
     const struct { const char* text; int error; unsigned offset; } cases[] = {
-        {"select 'abc", 1756, 7},
-        {"select \"abc", 1756, 7},
-        {"select q'[abc]", 1756, 7},
-        {"select 1; select 2", 933, 10},
-        {"", 900, 0},
-        {" -- nothing", 900, 11},
-        {"selection", 900, 0},
-        {"end", 900, 0},
-        {"End;", 900, 0},
-        {"/* */ pragma page_size", 900, 6},
-        {"attach 'x' as y", 900, 0},
-        {"detach y", 900, 0},
-        {"vacuum", 900, 0},
-        {"reindex", 900, 0},
-        {"explain pragma page_size", 900, 0},
-        {"; pragma page_size", 900, 0},
-        {"begin open :c for select 1 end;", 6550, 31},
-        {"begin if x then null; end if; end;", 6550, 6},
-        {"begin open :c for ; end;", 6550, 6},
-        {"begin select 1 from t; end;", 6550, 6},
-        {"begin null; end; select 1", 6550, 17},
-        {"begin null;", 6550, 11},
+        {"select 'abc", 1756, 7}, {"select \"abc", 1756, 7}, {"select q'[abc]", 1756, 7},
+        {"select 1; select 2", 933, 10}, {"", 900, 0}, {" -- nothing", 900, 11}, {"selection", 900, 0}, {"end", 900, 0},
+        {"End;", 900, 0}, {"/* */ pragma page_size", 900, 6}, {"attach 'x' as y", 900, 0}, {"detach y", 900, 0},
+        {"vacuum", 900, 0}, {"reindex", 900, 0}, {"explain pragma page_size", 900, 0}, {"; pragma page_size", 900, 0},
+        {"begin open :c for select 1 end;", 6550, 31}, {"begin if x then null; end if; end;", 6550, 6},
+        {"begin open :c for ; end;", 6550, 6}, {"begin select 1 from t; end;", 6550, 6},
+        {"begin null; end; select 1", 6550, 17}, {"begin null;", 6550, 11},
         {"declare x number; begin null; end;", 6550, 0},
     };
     for (const auto& c : cases) {
@@ -184,8 +166,7 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"select sysdate, t.sysdate, sysdate(1), 'sysdate' as sysdate",
          "select (now()), t.sysdate, sysdate(1), 'sysdate' as sysdate"},
         {"select 1 from dual", "select 1 from (select 'X' as dummy) as dual"},
-        {"select 1 minus select 2", "select 1 except select 2"},
-        {"select minus from t", "select minus from t"},
+        {"select 1 minus select 2", "select 1 except select 2"}, {"select minus from t", "select minus from t"},
         {"select d.dummy from DUAL d where 1=1", "select d.dummy from (select 'X' as dummy) d where 1=1"},
         {"create table t(number number(10,2), raw long raw, v varchar2(20 char), x number(*,3))",
          "create table t(number numeric(10,2), raw blob, v varchar_c(20 ), x numeric(38,3))"},
@@ -199,7 +180,8 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"alter table t add a number default 1 + 1", "alter table t add a numeric default (1 + 1)"},
         {"create table t(a varchar2(9 byte), b nvarchar2(9), c char(9 char), d char varying(2 CHAR) default 'x')",
          "create table t(a varchar(9 ), b nvarchar2(9), c char_c(9 ), d char varying_c(2 ) default 'x')"},
-        {"select cast(a as char(9 char)), cast(a as char(9 byte)) from t", "select to_char_c(a , 9), to_char(a , 9) from t"},
+        {"select cast(a as char(9 char)), cast(a as char(9 byte)) from t",
+         "select to_char_c(a , 9), to_char(a , 9) from t"},
         {"alter table number add number number", "alter table number add number numeric"},
         {"select cast(cast(:1 as decfloat(34)) as varchar2(9)), number, count(*) from t",
          "select cast(cast(?1 as numeric(34)) as varchar(9)), number, count(*) from t"},
@@ -210,8 +192,7 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"select a from t for update nowait", "select a from t "},
         {"insert into t values(date '2024-2-9', timestamp '2024-02-09 10:11:12.5', date 'x')",
          "insert into t values('2024-02-09 00:00:00', '2024-02-09 10:11:12.5', date 'x')"},
-        {"insert into t values(:a :b, :c:i)", "insert into t values(?1 ?2, ?3)"},
-        {"select 1 ;  ", "select 1"},
+        {"insert into t values(:a :b, :c:i)", "insert into t values(?1 ?2, ?3)"}, {"select 1 ;  ", "select 1"},
     };
     for (const auto& c : cases) EXPECT_EQ(Rewritten(c.text), c.rewritten) << c.text;
 }
