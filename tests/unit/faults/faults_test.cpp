@@ -29,8 +29,9 @@ struct Case {
 void PrintTo(const Case& c, std::ostream* out) { *out << c.scenario.name; }
 
 std::string Described(const Plan& plan) {
-    return std::string(plan.whose == Whose::application ? "the application's" : "the library's") + " allocation " +
-           std::to_string(plan.at) + (plan.how == How::alone ? " alone (" : " and all that follow (") + Seen().first + ")";
+    const std::string whose = plan.whose == Whose::application ? "the application's" : "the library's";
+    const std::string how = plan.how == How::alone ? " alone (" : " and all that follow (";
+    return whose + " allocation " + std::to_string(plan.at) + how + Seen().first + ")";
 }
 
 enum class End { whole, stopped };

@@ -55,7 +55,8 @@ void InitializeAndLogOn2(World& w) {
     w.Step("OCIEnvInit", [&] { return OCIEnvInit(&w.env, OCI_DEFAULT, 16, nullptr); }, Told::code);
     OwnEnvironment(w);
     w.Step("OCILogon2", [&] {
-        return OCILogon2(w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8, OCI_LOGON2_STMTCACHE);
+        return OCILogon2(w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8,
+                         OCI_LOGON2_STMTCACHE);
     });
     w.AtEnd([&w] { return OCILogoff(std::exchange(w.svc, nullptr), w.err); });
     w.Step("OCIBreak", [&] { return OCIBreak(w.svc, w.err); });
@@ -128,7 +129,9 @@ void AttachAndBegin(World& w) {
     w.AtEnd([&w, svc, session] { return OCISessionEnd(svc, w.err, session, OCI_DEFAULT); });
     OraText* name = nullptr;
     ub4 length = 0;
-    w.Step("OCIAttrGet", [&] { return OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &length, OCI_ATTR_USERNAME, w.err); });
+    w.Step("OCIAttrGet", [&] {
+        return OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &length, OCI_ATTR_USERNAME, w.err);
+    });
     w.See(length);
     w.Step("OCIPing", [&] { return OCIPing(svc, w.err, OCI_DEFAULT); });
     OraText version[200];
@@ -144,6 +147,12 @@ void Account(World& w) {
     EXPECT_EQ(OCILogon(w.env, w.err, &svc, World::Text("ann"), 3, World::Text("one"), 3, World::Text(database),
                        World::Size(database)), OCI_SUCCESS);
     EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS);
+}
+
+// Who owns the file is let in.
+void SystemUser(World& w) {
+    LogOn(w, "", "", w.Folder() + "/accounts.db");
+    w.See("in");
 }
 
 void PasswordChange(World& w) {
@@ -178,7 +187,8 @@ void FirstLogon(World& w) {
 }
 
 void MustRun(World& w, OCISvcCtx* svc, OCIStmt* stmt, std::string_view sql) {
-    EXPECT_EQ(OCIStmtPrepare(stmt, w.err, World::Text(sql), World::Size(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+    EXPECT_EQ(OCIStmtPrepare(stmt, w.err, World::Text(sql), World::Size(sql), OCI_NTV_SYNTAX, OCI_DEFAULT),
+              OCI_SUCCESS);
     EXPECT_EQ(OCIStmtExecute(svc, stmt, w.err, 1, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS) << sql;
 }
 
@@ -204,9 +214,10 @@ void LogoffCommits(World& w) {
     MustRun(w, svc, change, "insert into t values(1)");
     sb4 number = 0;
     OCIDefine* define = nullptr;
-    OCIStmtPrepare(static_cast<OCIStmt*>(reading), w.err, World::Text("select a from t"), 15, OCI_NTV_SYNTAX, 0);
-    OCIDefineByPos(static_cast<OCIStmt*>(reading), &define, w.err, 1, &number, 4, SQLT_INT, nullptr, nullptr, nullptr, 0);
-    OCIStmtExecute(svc, static_cast<OCIStmt*>(reading), w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT);
+    auto* const query = static_cast<OCIStmt*>(reading);
+    OCIStmtPrepare(query, w.err, World::Text("select a from t"), 15, OCI_NTV_SYNTAX, OCI_DEFAULT);
+    OCIDefineByPos(query, &define, w.err, 1, &number, 4, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT);
+    EXPECT_EQ(OCIStmtExecute(svc, query, w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
     bool failed = false;
     try {
         w.Step("OCILogoff", [&] { return OCILogoff(svc, w.err); });
@@ -273,6 +284,7 @@ constexpr Scenario kScenarios[] = {
     {"HandlesAndDescriptors", Ground::environment, nullptr, HandlesAndDescriptors, "made;"},
     {"AttachAndBegin", Ground::environment, nullptr, AttachAndBegin, "36;version;", OCI_UTF16},
     {"FirstLogon", Ground::environment, nullptr, FirstLogon, "1017;"},
+    {"SystemUser", Ground::environment, Account, SystemUser, "in;"},
     {"PasswordChange", Ground::environment, Account, PasswordChange, "changed;"},
     {"LogoffCommits", Ground::environment, nullptr, LogoffCommits, "1;"},
     {"ErrorsWithWords", Ground::environment, nullptr, ErrorsWithWords, "30152;named;"},

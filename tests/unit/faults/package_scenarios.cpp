@@ -45,9 +45,10 @@ void NumberArithmetic(World& w) {
 void NumberFunctions(World& w) {
     const OCINumber half = Number(w, "0.5"), large = Number(w, "123.456"), exponent = Number(w, "7.25");
     using Unary = sword (*)(OCIError*, const OCINumber*, OCINumber*);
-    for (const Unary function : {OCINumberAbs, OCINumberCeil, OCINumberFloor, OCINumberNeg, OCINumberArcCos, OCINumberArcSin, OCINumberArcTan, OCINumberCos, OCINumberExp,
-                                 OCINumberHypCos, OCINumberHypSin, OCINumberHypTan, OCINumberLn, OCINumberSin,
-                                 OCINumberSqrt, OCINumberTan}) {
+    for (const Unary function :
+         {OCINumberAbs, OCINumberCeil, OCINumberFloor, OCINumberNeg, OCINumberArcCos, OCINumberArcSin,
+          OCINumberArcTan, OCINumberCos, OCINumberExp, OCINumberHypCos, OCINumberHypSin, OCINumberHypTan, OCINumberLn,
+          OCINumberSin, OCINumberSqrt, OCINumberTan}) {
         OCINumber result{};
         w.Step("a number function", [&] { return function(w.err, &half, &result); });
         SeeNumber(w, result);
@@ -110,7 +111,8 @@ void Dates(World& w) {
     w.Step("OCIDateSysDate", [&] { return OCIDateSysDate(w.err, &now); });
     EXPECT_GT(now.OCIDateYYYY, 2000);
     w.Step("OCIDateFromText", [&] {
-        return OCIDateFromText(w.err, World::Text("29-FEB-24"), 9, World::Text("DD-MON-RR"), 9, nullptr, 0, &this_century);
+        return OCIDateFromText(w.err, World::Text("29-FEB-24"), 9, World::Text("DD-MON-RR"), 9, nullptr, 0,
+                               &this_century);
     });
     w.See(this_century.OCIDateYYYY);
     OraText text[200] = "";
@@ -167,7 +169,8 @@ void ZoneOfTheProcess(World& w) {
     auto* local = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_LTZ);
     const auto construct = [&](OCIDateTime* value, std::string_view zone) {
         w.Step("OCIDateTimeConstruct", [&] {
-            return OCIDateTimeConstruct(w.env, w.err, value, 2024, 7, 15, 13, 14, 15, 5, World::Text(zone), zone.size());
+            return OCIDateTimeConstruct(w.env, w.err, value, 2024, 7, 15, 13, 14, 15, 5, World::Text(zone),
+                                        zone.size());
         });
     };
     OCIDate now{};
@@ -373,8 +376,8 @@ constexpr Scenario kScenarios[] = {
     {"NumberForms", Ground::environment, nullptr, NumberForms,
      "12340625;+1.234500E+03; EUR1.234,06;1234,0625;       MCCXXXIV; 1.2E+03;123406;    4D2;"},
     {"Dates", Ground::environment, nullptr, Dates,
-     "2024;Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED SIXTY-SIX, "
-     "11:12:13 AM;"},
+     "2024;Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED "
+     "SIXTY-SIX, 11:12:13 AM;"},
     {"Datetimes", Ground::environment, FindRegions, Datetimes, "-1;13;"},
     {"ZoneOfTheProcess", Ground::environment, InStJohns, ZoneOfTheProcess, "1;13;", OCI_DEFAULT, true},
     {"Strings", Ground::environment, nullptr, Strings, "a text that is too long for the room of the first;"},

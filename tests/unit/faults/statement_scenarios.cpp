@@ -6,7 +6,7 @@ namespace {
 
 void Table(World& w) {
     w.Sql("create table t(a number primary key, b varchar2(100), d date, c char(8))");
-    w.Sql("create table empty(a number, b varchar2(100))");
+    w.Sql("create table many(a number, b date, c varchar2(40), d timestamp, e clob, f number)");
 }
 
 // A row of the same transaction that no failure may take away.
@@ -15,7 +15,9 @@ void EarlierRow(World& w) {
     w.Keeps("select count(*) from t", "1");
 }
 
-std::string Rows(World& w) { return w.One("select group_concat(a || coalesce(b, '-')) from (select * from t order by a)"); }
+std::string Rows(World& w) {
+    return w.One("select group_concat(a || coalesce(b, '-')) from (select * from t order by a)");
+}
 
 ub4 QuietAttribute(World& w, ub4 attribute) {
     ub4 value = 99;
@@ -126,6 +128,32 @@ void BatchErrors(World& w) {
         w.See(w.Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, row, OCI_HTYPE_ERROR));
     }
     w.See(Rows(w));
+}
+
+// Values of the packages and of descriptors, and a long one, as binds.
+void ManyTypesIn(World& w) {
+    EarlierRow(w);
+    OCINumber number{};
+    const sb4 seven = 7;
+    EXPECT_EQ(OCINumberFromInt(w.err, &seven, sizeof seven, OCI_NUMBER_SIGNED, &number), OCI_SUCCESS);
+    OCIDate date{2024, 2, 29, {1, 2, 3}};
+    static OCIString* string;
+    string = nullptr;
+    w.AtEnd([&w] { return string ? OCIStringResize(w.env, w.err, 0, &string) : OCI_SUCCESS; });
+    EXPECT_EQ(OCIStringAssignText(w.env, w.err, World::Text("a string of the package"), 23, &string), OCI_SUCCESS);
+    auto* stamp = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
+    EXPECT_EQ(OCIDateTimeConstruct(w.env, w.err, stamp, 2024, 7, 15, 13, 14, 15, 5, nullptr, 0), OCI_SUCCESS);
+    std::string text(70000, 'x');
+    double real = 2.25;
+    w.Prepare("insert into many values(:1, :2, :3, :4, :5, :6)");
+    w.Bind(1, {&number, sizeof number, SQLT_VNU});
+    w.Bind(2, {&date, sizeof date, SQLT_ODT});
+    w.Bind(3, {&string, sizeof string, SQLT_VST});
+    w.Bind(4, {&stamp, sizeof stamp, SQLT_TIMESTAMP});
+    w.Bind(5, {text.data(), 70000, SQLT_LNG});
+    w.Bind(6, {&real, sizeof real, SQLT_FLT});
+    w.Execute();
+    w.See(w.One("select a || ' ' || b || ' ' || c || ' ' || d || ' ' || length(e) || ' ' || f from many"));
 }
 
 void Returning(World& w) {
@@ -374,8 +402,8 @@ void StatementCache(World& w) {
         return OCIAttrSet(w.svc, OCI_HTYPE_SVCCTX, &none, 0, OCI_ATTR_STMTCACHESIZE, w.err);
     });
     OCIStmt* const plain = w.stmt;
-    for (const std::string_view sql :
-         {"select 1 from dual", "select 2 from dual", "select 1 from dual", "select 3 from dual", "select 2 from dual"}) {
+    for (const char digit : {'1', '2', '1', '3', '2'}) {
+        const std::string sql = std::string("select ") + digit + " from dual";
         OCIStmt* statement = nullptr;
         w.Step("OCIStmtPrepare2", [&] {
             return OCIStmtPrepare2(w.svc, &statement, w.err, World::Text(sql), World::Size(sql), nullptr, 0,
@@ -413,7 +441,9 @@ void DescribedColumns(World& w) {
         w.AtEnd([parameter] { return OCIDescriptorFree(parameter, OCI_DTYPE_PARAM); });
         OraText* name = nullptr;
         ub4 length = 0;
-        w.Step("OCIAttrGet", [&] { return OCIAttrGet(parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, w.err); });
+        w.Step("OCIAttrGet", [&] {
+            return OCIAttrGet(parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, w.err);
+        });
         w.See({reinterpret_cast<char*>(name), length});
         w.See(w.Attribute<ub2>(OCI_ATTR_DATA_TYPE, parameter, OCI_DTYPE_PARAM));
     }
@@ -435,6 +465,8 @@ constexpr Scenario kScenarios[] = {
     {"ArrayOfStructures", Ground::session, Table, ArrayOfStructures,
      "earlier;a text too long for a short string;two;-;"},
     {"BatchErrors", Ground::session, Table, BatchErrors, "2;1;1;1;3;0earlier,10aa,30-,50ee;"},
+    {"ManyTypesIn", Ground::session, Table, ManyTypesIn,
+     "7 2024-02-29 01:02:03 a string of the package 2024-07-15 13:14:15 70000 2.25;"},
     {"Returning", Ground::session, Table, Returning,
      "naa;na text too long for a short string;;0earlier,10naa,20na text too long for a short string,30-;"},
     {"FunctionsAndComparisons", Ground::session, Table, FunctionsAndComparisons,

@@ -111,11 +111,12 @@ sb4 World::Number(dvoid* handle, ub4 type, std::string* text) {
 
 void World::CheckFailure(std::string_view name, Told told, sb4 also) {
     const std::string what = std::string(name) + ", without " + Seen().first;
-    EXPECT_TRUE(Seen().failed > 0 || also != kOutOfMemory) << name << " fails of itself: " << (err ? Number(err, OCI_HTYPE_ERROR) : 0);
+    const sb4 own = err ? Number(err, OCI_HTYPE_ERROR) : 0;
+    EXPECT_TRUE(Seen().failed > 0 || also != kOutOfMemory) << name << " fails of itself: " << own;
     if (told == Told::code) return;
     std::string text;
-    const bool by_handle = told == Told::error_handle;
-    const sb4 number = Number(by_handle ? static_cast<dvoid*>(err) : env, by_handle ? OCI_HTYPE_ERROR : OCI_HTYPE_ENV, &text);
+    const sb4 number =
+        told == Told::error_handle ? Number(err, OCI_HTYPE_ERROR, &text) : Number(env, OCI_HTYPE_ENV, &text);
     EXPECT_TRUE(number == kOutOfMemory || number == also) << number << ": " << what;
     rolled_back_ = text.find(kRolledBack) != std::string::npos;
 }

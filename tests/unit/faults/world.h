@@ -36,11 +36,10 @@ public:
 
     // ---- Steps
 
-    // Any call; `name` is for messages. OCI_ERROR must be memory's fault and told so, by 1019 or, where
-    // another number is as good or what the call is for, by `also`; then Stopped is thrown.
+    // Any call; `name` is for messages. OCI_ERROR must be memory's fault and told so, by 1019 or, where another number
+    // is as good or what the call is made for, by `also`; then Stopped is thrown.
     template <class Call>
-    sword Step(std::string_view name, Call call, Told told = Told::error_handle,
-               sb4 also = kOutOfMemory) {
+    sword Step(std::string_view name, Call call, Told told = Told::error_handle, sb4 also = kOutOfMemory) {
         const sword code = Disturbed(call);
         if (code == OCI_ERROR) {
             CheckFailure(name, told, also);
