@@ -54,11 +54,19 @@ sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset,
     });
 }
 
+// A handle that a statement made serves no other; one that the application allocated, whoever took it.
+template <class Handle>
+Statement* StatementOf(const Handle& handle) {
+    if (auto* maker = Live<Statement>(handle.Parent())) return maker;
+    const std::shared_ptr<StatementShare> owner = handle.area->Owner();
+    return owner ? owner->Find() : nullptr;
+}
+
+// Holds the statement's lock alone, which the handle's is, too, as long as it belongs to it.
 template <class Handle>
 sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece) {
-    return Enter<Handle>(object, err, [&](Handle& handle) {
-        const std::shared_ptr<StatementShare> owner = handle.area->Owner();
-        Statement* statement = owner ? owner->Find() : nullptr;
+    return EnterUnlocked<Handle>(object, err, [&](const Handle& handle) {
+        Statement* const statement = StatementOf(handle);
         if (!statement) return Error(errors::kIllegalOperation);
         const SerialLock lock(*statement);
         // Without a session there is no lock, and nothing that could wait for a piece.
@@ -129,7 +137,7 @@ sword OCIStmtGetBindInfo(OCIStmt* stmt, OCIError* err, ub4 size, ub4 startloc, s
 
 sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type, ub1* inOut, ub4* iter, ub4* idx,
                           ub1* piece) {
-    return Enter<Statement>(stmt, err, [&](const Statement& statement) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
         Statement::PieceInfo info;
         Status status = statement.GetPieceInfo(info);
         if (!status.Ok()) return status;

@@ -49,6 +49,8 @@ public:
     // Whether the application could still hand the handle in.
     [[nodiscard]] bool HasHandle() const noexcept { return live::KindOf(workspace.holder) != Kind::none; }
     [[nodiscard]] Object* Handle() const noexcept { return Live<Object>(workspace.holder); }
+    // The handle as the application knows it, for who has found it living in this call.
+    [[nodiscard]] dvoid* Pointer() const noexcept { return const_cast<dvoid*>(workspace.holder.load()); }
     [[nodiscard]] TypeCode HandleType() const { return handle_type_; }
 
     // The statement that the area belongs to; null: none.

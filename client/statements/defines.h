@@ -40,6 +40,8 @@ public:
     Status Activate(const std::vector<engine::Column>& columns);
     [[nodiscard]] const std::vector<Active>& All() const { return active_; }    // as Activate left them
     [[nodiscard]] bool InPieces() const { return in_pieces_; }                  // some are
+    // The number of erased objects when all of them were found living.
+    [[nodiscard]] std::uint64_t Seen() const { return seen_; }
 
     // A row into element `index` of the defines that do not take pieces; answers the gravest thing that happened: an
     // error before 24345 before 0.
@@ -52,6 +54,6 @@ private:
     std::vector<std::shared_ptr<DataArea>> retired_;    // of the text before
     std::vector<Active> active_;
     bool changed_ = true;    // since active_ was made
-    std::uint64_t seen_ = 0;    // erased objects when all of active_ were found living
+    std::uint64_t seen_ = 0;
     bool in_pieces_ = false;
 };

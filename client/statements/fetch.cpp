@@ -9,7 +9,7 @@ const std::vector<engine::Column>* Statement::Columns() {
     return &compiled_[0].query->Columns();
 }
 
-Status Statement::CheckFetch() const {
+Status Statement::CheckFetch() {
     if (pieces_.Wants() == PieceStream::Use::execute) return Error(errors::kOperationActive);
     if (run_.fetch_error != 0) return Error(run_.fetch_error);
     return run_.cursor.IsOpen() ? Status() : Error(errors::kFetchOutOfSequence);

@@ -56,7 +56,8 @@ bool SaysNull(const PieceBuffer& piece) {
 }
 
 Status PollingDriver::Supply(WantedPiece& wanted, PieceBuffer& place) {
-    place = std::exchange(wanted.area->piece, {});
+    place = wanted.area->piece;
+    wanted.area->piece.is_set = false;
     if (place.is_set) return {};
     if (wanted.asked) return Error(errors::kNoBuffer);
     wanted.asked = true;
@@ -81,10 +82,12 @@ void OwnRow::Keep(std::span<const engine::Datum> values) {
     }
 }
 
-PieceStream::Use PieceStream::Wants() const {
-    if (use_ == Use::none || !wanted_.area || !wanted_.area->HasHandle()) return Use::none;
-    const bool all = std::all_of(binds_.begin(), binds_.end(), [](const auto& bind) { return bind->HasHandle(); });
-    return all ? use_ : Use::none;
+void PieceStream::EndUnlessLiving() noexcept {
+    const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
+    const bool living = (!wanted_.area || wanted_.area->HasHandle()) &&
+                        std::all_of(binds_.begin(), binds_.end(), [](const auto& bind) { return bind->HasHandle(); });
+    if (living) seen_ = erased;
+    else End();
 }
 
 void PieceStream::End() noexcept {
@@ -92,13 +95,13 @@ void PieceStream::End() noexcept {
     wanted_ = {};
     binds_.clear();
     bind_ = 0;
-    value_at_hand_ = false;
 }
 
 // ---- Going in
 
 void PieceStream::StartExecute(const BoundText& text, const ExecuteArguments& arguments) {
     End();
+    seen_ = live::erased_objects.load(std::memory_order_acquire);
     for (std::size_t placeholder = 0; placeholder < text.Count(); ++placeholder) {
         const std::shared_ptr<BindArea>& bind = text.At(placeholder);
         if (!bind || !bind->InPieces() || !bind->HasHandle()) continue;
@@ -108,14 +111,14 @@ void PieceStream::StartExecute(const BoundText& text, const ExecuteArguments& ar
     arguments_ = arguments;
     wanted_.iteration = arguments.first;
     for (const auto& bind : binds_) bind->collected_null = false, bind->collected.clear();
-    wanted_.area = binds_[0];
+    wanted_.area = binds_[0].get();
     wanted_.area->piece = {};
 }
 
 Status PieceStream::Collect(PieceDriver& driver) {
     while (bind_ < binds_.size()) {
         BindArea& bind = *binds_[bind_];
-        wanted_.area = binds_[bind_];
+        wanted_.area = &bind;
         wanted_.out = false;
         PieceBuffer place;
         if (Status status = driver.Supply(wanted_, place); !status.Ok()) return status;
@@ -133,7 +136,7 @@ Status PieceStream::Collect(PieceDriver& driver) {
 void PieceStream::NextIteration() noexcept {
     ++wanted_.iteration;
     bind_ = 0;
-    wanted_.area = binds_[0];
+    wanted_.area = binds_[0].get();
     for (const auto& bind : binds_) bind->collected_null = false, bind->collected.clear();
 }
 
@@ -150,7 +153,6 @@ void PieceStream::Begin(ub4 row, std::span<const engine::Datum> values) {
     row_.Keep(values);
     wanted_.iteration = row;
     define_ = 0;
-    value_at_hand_ = false;
 }
 
 // The next define that takes its value in pieces, and that value; `found` is false at the end of the row.
@@ -162,18 +164,19 @@ Status PieceStream::NextValue(const Defines& defines, bool& found) {
     const Defines::Active& active = all[define_++];
     DataArea& area = *active.area;
     const engine::Datum& value = row_[active.column];
-    wanted_.area = active.area;
-    wanted_.continued = wanted_.asked = false;
-    area.piece = {};
     is_null_ = value.kind == engine::Kind::null;
     whole_ = {};
     int error = 0;
     if (!is_null_) error = active.renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, whole_);
     if (error == 0 && area.Type()->family == values::Family::text)
         error = values::ToApplication(whole_, area.workspace, whole_);
+    if (error != 0) return Error(error);
     rest_ = whole_;
-    value_at_hand_ = error == 0;
-    return error == 0 ? Status() : Error(error);
+    area.piece.is_set = false;
+    wanted_.area = &area;
+    wanted_.continued = wanted_.asked = false;
+    seen_ = defines.Seen();
+    return {};
 }
 
 Status PieceStream::TakePiece(const PieceBuffer& place, bool& value_ends) {
@@ -198,7 +201,7 @@ Status PieceStream::TakePiece(const PieceBuffer& place, bool& value_ends) {
 
 Status PieceStream::HandOut(const Defines& defines, PieceDriver& driver) {
     for (;;) {
-        if (!value_at_hand_) {
+        if (!wanted_.area) {
             bool found = false;
             Status status = NextValue(defines, found);
             if (status.Failed()) End();
@@ -212,7 +215,7 @@ Status PieceStream::HandOut(const Defines& defines, PieceDriver& driver) {
             if (value_ends) End();    // else another buffer may do
             return status;
         }
-        value_at_hand_ = !value_ends;
+        if (value_ends) wanted_.area = nullptr;
         wanted_.continued = !value_ends;
         wanted_.asked = false;
     }

@@ -7,6 +7,8 @@
 // taken whole or the application says LAST. The row whose values go out is the stream's own copy: whatever becomes of
 // the query meanwhile, its bytes stay.
 //
+// The defines stay as they were activated while a stream is under way: whoever changes them ends it first.
+//
 // Threads: under the statement's serial lock.
 #pragma once
 
@@ -22,7 +24,7 @@
 
 // The piece that is wanted next.
 struct WantedPiece {
-    std::shared_ptr<DataArea> area;
+    DataArea* area = nullptr; // one of the stream's binds or of the active defines; null while no value is at hand
     bool out = false;         // to the application
     ub4 iteration = 0;        // or row, from 0
     bool continued = false;   // the value has begun
@@ -62,7 +64,12 @@ class PieceStream {
 public:
     enum class Use : std::uint8_t { none, execute, fetch, fetch_by_execute };
 
-    [[nodiscard]] Use Wants() const;      // none when a handle that takes part is freed
+    // What the stream waits for. None when the handle of the wanted piece, or a bind that takes part, is freed: the
+    // operation ends then.
+    [[nodiscard]] Use Wants() noexcept {
+        if (use_ != Use::none && live::erased_objects.load(std::memory_order_acquire) != seen_) EndUnlessLiving();
+        return wanted_.area ? use_ : Use::none;
+    }
     [[nodiscard]] const WantedPiece& Wanted() const { return wanted_; }
     void End() noexcept;
 
@@ -82,11 +89,13 @@ public:
     [[nodiscard]] ub4 Rows() const { return arguments_.iterations; }
 
 private:
+    void EndUnlessLiving() noexcept;
     Status NextValue(const Defines& defines, bool& found);
     Status TakePiece(const PieceBuffer& place, bool& value_ends);
 
     Use use_ = Use::none;
     WantedPiece wanted_;
+    std::uint64_t seen_ = 0;    // erased objects when the handles that Wants looks at were found living
     ExecuteArguments arguments_{};
     // going in
     std::vector<std::shared_ptr<BindArea>> binds_;    // that take pieces, in order of the placeholders
@@ -94,7 +103,6 @@ private:
     // coming out
     OwnRow row_;
     std::size_t define_ = 0;           // the next one to look at
-    bool value_at_hand_ = false;
     bool is_null_ = false;
     std::string_view whole_, rest_;    // the value, and what of it is still to be taken
 };

@@ -5,10 +5,10 @@
 
 // ---- What is wanted
 
-Status Statement::GetPieceInfo(PieceInfo& info) const {
+Status Statement::GetPieceInfo(PieceInfo& info) {
     if (pieces_.Wants() == PieceStream::Use::none) return Error(errors::kIllegalOperation);
     const WantedPiece& wanted = pieces_.Wanted();
-    info = {wanted.area->Handle(),
+    info = {wanted.area->Pointer(),
             wanted.area->HandleType(),
             static_cast<ub1>(wanted.out ? OCI_PARAM_OUT : OCI_PARAM_IN),
             wanted.iteration,
@@ -18,10 +18,9 @@ Status Statement::GetPieceInfo(PieceInfo& info) const {
 }
 
 Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) {
-    PieceInfo info;
-    if (Status status = GetPieceInfo(info); !status.Ok()) return status;
+    if (pieces_.Wants() == PieceStream::Use::none) return Error(errors::kIllegalOperation);
     const WantedPiece& wanted = pieces_.Wanted();
-    if (wanted.area.get() != &area || piece.piece > OCI_LAST_PIECE) return Error(errors::kIllegalOperation);
+    if (wanted.area != &area || piece.piece > OCI_LAST_PIECE) return Error(errors::kIllegalOperation);
     const bool null_in = !wanted.out && SaysNull(piece);
     if (!null_in && !piece.length) return Error(errors::kBadLength);
     if (!null_in && !piece.buffer) return Error(errors::kBadBuffer);

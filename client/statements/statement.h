@@ -78,7 +78,7 @@ public:
         ub4 index;
         ub1 piece;
     };
-    Status GetPieceInfo(PieceInfo& info) const;
+    Status GetPieceInfo(PieceInfo& info);
     // The area must be that of the handle that GetPieceInfo names.
     Status SetPieceInfo(DataArea& area, const PieceBuffer& piece);
 
@@ -160,7 +160,7 @@ private:
     // fetch.cpp
     const std::vector<engine::Column>* Columns();    // null when there are none
     Status FetchNow(ub4 rows, ub2 orientation, sb4 offset);
-    Status CheckFetch() const;
+    Status CheckFetch();
     Status FindFirst(ub2 orientation, sb4 offset, std::uint64_t& position);
     Status FetchRows(ub4 rows, ub4 first, const std::uint64_t* position);
     Status EndOfFetch();
