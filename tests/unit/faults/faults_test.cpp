@@ -38,6 +38,7 @@ enum class End { whole, stopped };
 
 End RunOnNewThread(const Scenario& scenario, World& world) {
     End end = End::whole;
+    world.Begin();
     std::thread([&] {
         try {
             scenario.run(world);
@@ -54,6 +55,7 @@ bool RunAndAgain(const Scenario& scenario, World& world, const Plan& plan) {
     const End end = RunOnNewThread(scenario, world);
     const long failed = Seen().failed;
     SCOPED_TRACE(Described(plan));
+    EXPECT_TRUE(end == End::whole || failed > 0) << "stopped, though no memory failed";
     if (end == End::whole) {
         EXPECT_EQ(world.seen, scenario.expected) << (failed ? "though memory failed" : "");
     }

@@ -37,7 +37,6 @@ void World::OpenEnvironment() {
 void World::OpenSession() {
     const std::string database = Encoded(":memory:");
     Must(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(database), Size(database)), "OCILogon");
-    Must(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&stmt), OCI_HTYPE_STMT, 0, nullptr), "OCIHandleAlloc");
     Must(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&quiet_), OCI_HTYPE_STMT, 0, nullptr), "OCIHandleAlloc");
 }
 
@@ -143,6 +142,14 @@ void World::CheckKept() {
     if (!kept_query_.empty()) {
         EXPECT_EQ(One(kept_query_), rolled_back_ ? kept_rolled_back_ : kept_) << kept_query_;
     }
+}
+
+void World::Begin() {
+    if (ground_ != Ground::session) return;
+    dvoid* handle = nullptr;
+    Must(OCIHandleAlloc(env, &handle, OCI_HTYPE_STMT, 0, nullptr), "OCIHandleAlloc");
+    stmt = static_cast<OCIStmt*>(handle);
+    AtEnd([handle] { return OCIHandleFree(handle, OCI_HTYPE_STMT); });
 }
 
 void World::Reset() {

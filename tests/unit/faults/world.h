@@ -119,6 +119,8 @@ public:
     void CheckKept();
     // The number of a handle's first record, 0 without one, and its text.
     static sb4 Number(dvoid* handle, ub4 type, std::string* text = nullptr);
+    // Before each run: a statement that has not kept anything from the run before.
+    void Begin();
     // Ends what a scenario began, its transaction too.
     void Reset();
     // A folder of its own for files, gone with the world.
