@@ -13,39 +13,27 @@ namespace {
 int object_a, object_b;  // stand for what the library returned
 
 TEST(Registry, CapacitiesAndMessages) {
-    const struct { Kind kind; int capacity; const char* overflow; const char* in_use; } cases[] = {
-        {Kind::environment, 30, "Reached max environment handle count - 30\n",
-         "*** Environment handle already in use\n"},
-        {Kind::error, 30, "Reached max error handle count - 30\n", "*** Error handle already in use\n"},
-        {Kind::svc, 800, "Reached max svc handle count - 800\n", "*** Svc handle already in use\n"},
-        {Kind::server, 800, "Reached max server handle count - 800\n", "*** Server handle already in use\n"},
-        {Kind::session, 800, "Reached max session handle count - 800\n", "*** Session handle already in use\n"},
-        {Kind::trans, 800, "Reached max trans handle count - 800\n", "*** Trans handle already in use\n"},
-        {Kind::spool, 800, "Reached max spool handle count - 800\n", "*** SPool handle already in use\n"},
-        {Kind::cpool, 800, "Reached max cpool handle count - 800\n", "*** SPool handle already in use\n"},
-        {Kind::stmt, 650, "Reached max stmt handle count - 650\n", "*** Stmt handle already in use\n"},
-        {Kind::describe, 650, "Reached max describe handle count - 650\n", "*** Describe handle already in use\n"},
-        {Kind::bind, 256, "Reached max bind handle count - 256\n", "*** Bind handle already in use\n"},
-        {Kind::define, 256, "Reached max define handle count - 256\n", "*** Define handle already in use\n"},
-        {Kind::param, 100, "Reached max param handle count - 100\n", ""},
-        {Kind::lob, 650, "Reached max lob handle count - 650\n", "*** Lob handle already in use\n"},
-        {Kind::result, 650, "Reached max lob handle count - 650\n", "*** Result handle already in use\n"},
-        {Kind::rowid, 650, "Reached max rowid handle count - 650\n", "*** Rowid handle already in use\n"},
-        {Kind::file, 650, "Reached max file handle count - 650\n", "*** File handle already in use\n"},
-        {Kind::datetime, 650, "Reached max datetime handle count - 650\n", "*** Datetime handle already in use\n"},
-        {Kind::string, 650, "Reached max string handle count - 650\n", ""},
-        {Kind::raw, 650, "Reached max raw handle count - 650\n", ""},
-        {Kind::mutex, 650, "Reached max mutex handle count - 650\n", "*** Mutex handle already in use\n"},
-        {Kind::key, 650, "Reached max key handle count - 650\n", "*** Key handle already in use\n"},
-        {Kind::tid, 650, "Reached max tid handle count - 650\n", "*** tid handle already in use\n"},
-        {Kind::thnd, 650, "Reached max thnd handle count - 650\n", "*** thnd handle already in use\n"},
+    // A kind without the last word says nothing of a name in use.
+    const struct { Kind kind; int capacity; std::string overflow, in_use; } cases[] = {
+        {Kind::environment, 30, "environment", "Environment"}, {Kind::error, 30, "error", "Error"},
+        {Kind::svc, 800, "svc", "Svc"}, {Kind::server, 800, "server", "Server"},
+        {Kind::session, 800, "session", "Session"}, {Kind::trans, 800, "trans", "Trans"},
+        {Kind::spool, 800, "spool", "SPool"}, {Kind::cpool, 800, "cpool", "SPool"}, {Kind::stmt, 650, "stmt", "Stmt"},
+        {Kind::describe, 650, "describe", "Describe"}, {Kind::bind, 256, "bind", "Bind"},
+        {Kind::define, 256, "define", "Define"}, {Kind::param, 100, "param", ""}, {Kind::lob, 650, "lob", "Lob"},
+        {Kind::result, 650, "lob", "Result"}, {Kind::rowid, 650, "rowid", "Rowid"}, {Kind::file, 650, "file", "File"},
+        {Kind::datetime, 650, "datetime", "Datetime"}, {Kind::string, 650, "string", ""}, {Kind::raw, 650, "raw", ""},
+        {Kind::mutex, 650, "mutex", "Mutex"}, {Kind::key, 650, "key", "Key"}, {Kind::tid, 650, "tid", "tid"},
+        {Kind::thnd, 650, "thnd", "thnd"},
     };
     for (const auto& c : cases) {
         const auto name = [](int number) { return "n" + std::to_string(number); };
         for (int number = 0; number < c.capacity; ++number)
             ASSERT_NE(Register(c.kind, name(number).c_str(), &object_a, nullptr), nullptr) << c.overflow << number;
-        EXPECT_EQ(Printed([&] { EXPECT_EQ(Register(c.kind, "one more", &object_a, nullptr), nullptr); }), c.overflow);
-        EXPECT_EQ(Printed([&] { EXPECT_TRUE(CheckInUse(c.kind, "n0")); }), c.in_use);
+        EXPECT_EQ(Printed([&] { EXPECT_EQ(Register(c.kind, "one more", &object_a, nullptr), nullptr); }),
+                  "Reached max " + c.overflow + " handle count - " + std::to_string(c.capacity) + "\n");
+        EXPECT_EQ(Printed([&] { EXPECT_TRUE(CheckInUse(c.kind, "n0")); }),
+                  c.in_use.empty() ? "" : "*** " + c.in_use + " handle already in use\n");
         EXPECT_EQ(Printed([&] { EXPECT_FALSE(CheckInUse(c.kind, "one more")); }), "");
         for (int number = 0; number < c.capacity; ++number) Release(c.kind, name(number).c_str());
         EXPECT_EQ(FindByName(c.kind, "n0"), nullptr) << c.overflow;
