@@ -39,12 +39,7 @@
 
 namespace {
 
-struct Output {
-    size_t position;
-    size_t offset;
-    std::string type;
-    std::string value;
-};
+struct Output { size_t position, offset; std::string type, value; };
 
 struct Answer {
     long long result = 0;
@@ -55,13 +50,10 @@ struct Answer {
 
 // Callbacks of the driver, the last of each kind, and their contexts.
 struct Installed {
-    void* in_context = nullptr;
+    void *in_context = nullptr, *out_context = nullptr, *define_context = nullptr, *lob_context = nullptr;
     OCICallbackInBind in = nullptr;
-    void* out_context = nullptr;
     OCICallbackOutBind out = nullptr;
-    void* define_context = nullptr;
     OCICallbackDefine define = nullptr;
-    void* lob_context = nullptr;
     OCICallbackLobRead read = nullptr;
     OCICallbackLobWrite write = nullptr;
 };
