@@ -145,6 +145,7 @@ TEST_F(DateCalls, TypesHaveTheirParts) {
         EXPECT_EQ(TimeOf(value), has_time ? "1:2:3.999999999" : "1878") << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 4)), has_time ? 0 : 1878) << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 1000000000)), 1880) << c.type;
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 24, 2, 3, 4)), has_time ? 1850 : 1878) << c.type;
         ub4 flags = 1;
         EXPECT_EQ(Answer(OCIDateTimeCheckNS(env_, err_, value, &flags)), 0) << c.type;
         EXPECT_EQ(flags, 0u) << c.type;
