@@ -3,12 +3,12 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstring>
 #include <new>
 #include <thread>
 
 #include "engine/sqlite/accounts.h"
 #include "engine/sqlite/query.h"
-#include "engine/sqlite/value_targets.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {
@@ -24,6 +24,7 @@ constexpr std::size_t kLongestStatement = 1000000000;
 constexpr const char* kOwnTexts[] = {"begin immediate",
                                      "begin",
                                      "select 1 from sqlite_schema limit 1",
+                                     "pragma schema_version",
                                      "commit",
                                      "rollback",
                                      "savepoint kelp_mark",
@@ -136,44 +137,65 @@ Status SqliteConnection::Compile(const StatementSource& source, std::unique_ptr<
     const bool in_transaction = InTransaction();
     Status status;
     try {
-        status = CompileNow(source, query, error_offset);
+        Compilation made;
+        status = Make(source.sql, made, error_offset);
+        if (status.Ok()) query = std::make_unique<SqliteQuery>(*this, std::move(made), source.sql, source.effect);
     } catch (const std::bad_alloc&) {
         status = Error(errors::kOutOfMemory).From("SQLITE");
     }
     return in_transaction && !InTransaction() ? RolledBack(status) : status;
 }
 
-Status SqliteConnection::CompileNow(const StatementSource& source, std::unique_ptr<Query>& query,
-                                    std::uint32_t& error_offset) {
-    const std::string_view sql = source.sql;
+// The tables are looked at first: what changes meanwhile is seen when the statement runs.
+Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint32_t& error_offset) {
+    if (Status status = SeeSchema(made.schema); status.Failed()) return status;
     if (sql.size() > kLongestStatement) return Error(errors::kStatementTooLong).From("SQLITE");
     sqlite3* database = Database();
     int code = SQLITE_OK;
     std::size_t end = 0;
-    StatementHandle statement = CompileText(sql, code, &end);
+    made.table.reserve(sql.size());    // a name is no longer than its statement
+    table_ = &made.table;
+    made.statement = CompileText(sql, code, &end);
+    table_ = nullptr;
     if (code != SQLITE_OK) {
         const int offset = sqlite3_error_offset(database);
         if (offset >= 0) error_offset = static_cast<std::uint32_t>(offset);
         return Failure(database, code);
     }
-    if (!statement) return Error(errors::kInvalidStatement).From("SQLITE");
+    if (!made.statement) return Error(errors::kInvalidStatement).From("SQLITE");
     if (CompileText(sql.substr(end), code, nullptr) || (code & 0xFF) == SQLITE_ERROR || code == SQLITE_AUTH) {
         error_offset = static_cast<std::uint32_t>(end);
         return Error(errors::kNotProperlyEnded).From("SQLITE");
     }
     if (code != SQLITE_OK) return Failure(database, code);
 
-    ValueTargets targets;
-    if (Status status = FindValueTargets(database, sql, targets); status.Failed()) return status;
-    const std::string rewritten = targets.Rewritten(sql);
-    if (!rewritten.empty()) {
-        StatementHandle checked = CompileText(rewritten, code, nullptr);
-        if (code != SQLITE_OK) return Failure(database, code);
-        statement = std::move(checked);
+    if (Status status = FindValueTargets(database, sql, made.targets); status.Failed()) return status;
+    const std::string rewritten = made.targets.Rewritten(sql);
+    if (rewritten.empty()) return {};
+    StatementHandle checked = CompileText(rewritten, code, nullptr);
+    if (code != SQLITE_OK) return Failure(database, code);
+    made.statement = std::move(checked);
+    return {};
+}
+
+// Asked for once after each change of the database. The version comes before the look, which has SQLite read the
+// schema anew when it is an older one: what is compiled then is for tables of this version, or of a later one.
+Status SqliteConnection::SeeSchema(Schema& schema) {
+    unsigned data_version = 0;
+    const auto see = [&] { sqlite3_file_control(Database(), "main", SQLITE_FCNTL_DATA_VERSION, &data_version); };
+    if (!Private()) see();
+    if (!data_version_ || *data_version_ != data_version) {
+        if (Status status = CompileOwn(Own::version); status.Failed()) return status;
+        sqlite3_stmt* const statement = owns_[static_cast<std::size_t>(Own::version)].get();
+        const Resetting resetting(statement);
+        const int code = sqlite3_step(statement);
+        if (code != SQLITE_ROW) return Failure(Database(), code);
+        schema_.version = sqlite3_column_int(statement, 0);
+        if (!Private()) see();
+        if (Status status = Run(Own::look); status.Failed()) return status;
+        data_version_ = data_version;
     }
-    auto made = std::make_unique<SqliteQuery>(*this, std::move(statement), sql, source.effect);
-    for (const auto& parameter : targets.parameters) made->UseFor(parameter.index, parameter.column, parameter.purpose);
-    query = std::move(made);
+    schema = schema_;
     return {};
 }
 
@@ -344,13 +366,21 @@ int SqliteConnection::OnBusy(void* self, int attempts) {
     return 1;
 }
 
-void SqliteConnection::OnChange(void* self, int, const char*, const char*, sqlite3_int64 row) {
-    static_cast<SqliteConnection*>(self)->changed_row = row;
+void SqliteConnection::OnChange(void* self, int, const char*, const char* table, sqlite3_int64 row) {
+    auto& connection = *static_cast<SqliteConnection*>(self);
+    if (connection.changed_table && *connection.changed_table == table) connection.changed_row = row;
+}
+
+// SQLite tells the table of the statement before those of its triggers and cascades.
+void SqliteConnection::NoteTable(int action, const char* table) noexcept {
+    const bool changes = action == SQLITE_INSERT || action == SQLITE_UPDATE || action == SQLITE_DELETE;
+    if (changes && table_ && table_->empty() && std::strlen(table) <= table_->capacity()) table_->assign(table);
 }
 
 // Names of users may be read; hashes are nobody's business.
 int SqliteConnection::OnAccess(void* self, int action, const char* first, const char* second, const char*,
                                const char*) {
+    static_cast<SqliteConnection*>(self)->NoteTable(action, first);
     if (static_cast<SqliteConnection*>(self)->trusted_) return SQLITE_OK;
     const auto is = [](const char* name, const char* wanted) { return name && sqlite3_stricmp(name, wanted) == 0; };
     if (action == SQLITE_READ) return is(first, kAccounts) && is(second, kPasswords) ? SQLITE_DENY : SQLITE_OK;

@@ -14,10 +14,26 @@
 #include "engine/engine.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/home.h"
+#include "engine/sqlite/value_targets.h"
 
 namespace engine::sqlite {
 
 class SqliteQuery;
+
+// What a statement was compiled for: the tables as they were then.
+struct Schema {
+    int version = 0;                   // the file's word
+    std::uint64_t definitions = 0;     // run by this connection
+    bool operator==(const Schema&) const = default;
+};
+
+// One compiled statement, with what its values are for.
+struct Compilation {
+    StatementHandle statement;
+    ValueTargets targets;
+    std::string table;    // that it changes; those of triggers and cascades are others
+    Schema schema;
+};
 
 class SqliteConnection final : public Connection {
 public:
@@ -64,6 +80,13 @@ public:
     // The status of a call on the database that has just failed.
     Status Failed(int code, Verb verb, bool was_in_transaction) noexcept;
 
+    // Compiles a text, `error_offset` as in Compile.
+    Status Make(std::string_view sql, Compilation& made, std::uint32_t& error_offset);
+    // The tables as they are for a statement that runs now: inside a transaction as this one sees them, else as they
+    // were when the connection last looked at the file, or later.
+    Status SeeSchema(Schema& schema);
+    void Defined() noexcept { ++schema_.definitions; }    // a definition has run
+
     // What a statement needs to run.
     struct Entry {
         Effect effect = Effect::reads;
@@ -79,7 +102,9 @@ public:
     // Lets the open queries but `except` read the rest of their rows, so that none holds an old state of the database.
     // The first failure, of which the fetch that gets there is told: of interest if it has lost the transaction.
     Status ReadAhead(const SqliteQuery* except) noexcept;
-    std::optional<std::int64_t> changed_row;    // the last one, for whoever emptied it before
+    // The last row that was changed in a table, for whoever said which one and emptied it before.
+    std::optional<std::int64_t> changed_row;
+    const std::string* changed_table = nullptr;
 
     // While one lives, statements may read and change the accounts.
     class Trusted {
@@ -99,7 +124,7 @@ public:
 private:
     // The connection's own statements, compiled when they are first needed and kept: those that end or undo need no
     // memory then.
-    enum class Own : std::uint8_t { begin, begin_reading, look, commit, rollback, mark, undo, drop };
+    enum class Own : std::uint8_t { begin, begin_reading, look, version, commit, rollback, mark, undo, drop };
     static constexpr std::size_t kOwns = static_cast<std::size_t>(Own::drop) + 1;
     class Unheeding;
 
@@ -107,9 +132,9 @@ private:
     static int OnProgress(void* self);
     static int OnBusy(void* self, int attempts);
     static void OnChange(void* self, int operation, const char* schema, const char* table, sqlite3_int64 row);
+    void NoteTable(int action, const char* table) noexcept;
     static int OnAccess(void* self, int action, const char* first, const char* second, const char* schema,
                         const char* trigger);
-    Status CompileNow(const StatementSource& source, std::unique_ptr<Query>& query, std::uint32_t& error_offset);
     StatementHandle CompileText(std::string_view sql, int& code, std::size_t* end) noexcept;
     Status CompileOwn(Own own) noexcept;
     Status Run(Own own) noexcept;
@@ -125,6 +150,9 @@ private:
     bool read_only_ = false;           // the transaction, if there is one
     bool broken_ = false;
     bool utf8_ = true;
+    std::string* table_ = nullptr;     // takes the table that the statement which is compiled changes
+    Schema schema_;                    // as it was at data_version_
+    std::optional<unsigned> data_version_;
     std::chrono::steady_clock::time_point busy_since_;
     SqliteQuery* first_open_ = nullptr;
 };

@@ -36,19 +36,41 @@ bool HasRoom(std::vector<ArrayOutcome::Failure>& failures) noexcept {
 
 }  // namespace
 
-SqliteQuery::SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql, Effect effect)
+SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, std::string_view sql, Effect effect)
     : connection_(connection),
-      statement_(std::move(statement)),
+      statement_(std::move(compilation.statement)),
+      table_(std::move(compilation.table)),
+      schema_(compilation.schema),
       sql_(sql),
       verb_(VerbOf(sql_)),
       entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && IsSavepoint(sql)},
       parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))),
-      coercions_(parameters_.size()) {}
+      coercions_(CoercionsOf(compilation.targets, parameters_.size())) {}
 
 SqliteQuery::~SqliteQuery() { Close(); }
 
-void SqliteQuery::UseFor(std::size_t parameter, const Column& column, Coercion::Purpose purpose) {
-    if (parameter < coercions_.size()) coercions_[parameter] = std::make_unique<Coercion>(column, purpose);
+// By parameter: those whose values are stored into a column, or compared with it.
+SqliteQuery::Coercions SqliteQuery::CoercionsOf(const ValueTargets& targets, std::size_t parameters) {
+    Coercions coercions(parameters);
+    for (const auto& [index, column, purpose] : targets.parameters) {
+        if (index < parameters) coercions[index] = std::make_unique<Coercion>(column, purpose);
+    }
+    return coercions;
+}
+
+// SQLite sees to tables that have changed since, but what the values are for was found here: compiles it all anew.
+Status SqliteQuery::FollowSchema() {
+    Schema schema;
+    if (Status status = connection_.SeeSchema(schema); status.Failed() || schema == schema_) return status;
+    Compilation made;
+    std::uint32_t offset = 0;
+    if (Status status = connection_.Make(sql_, made, offset); status.Failed()) return status;
+    coercions_ = CoercionsOf(made.targets, parameters_.size());
+    statement_ = std::move(made.statement);
+    table_ = std::move(made.table);
+    schema_ = made.schema;
+    described_ = false;
+    return {};
 }
 
 // ---- The select list
@@ -231,11 +253,13 @@ Status SqliteQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOu
     if (connection_.Stopping()) return SqliteConnection::Stopped();
     std::vector<ArrayOutcome::Failure>& failures = outcome.failures;
     failures.reserve(failures.size() + 2);
-    Running running(connection_, statement_.get());
+    Running running(connection_, statement_);
     Status status = connection_.Enter(entry_, this, running.began);
+    if (status.Ok()) status = FollowSchema();
     if (status.Failed()) return status;
     const bool in_transaction = connection_.InTransaction();
     std::optional<std::int64_t> last_row;
+    connection_.changed_table = &table_;
     for (std::uint32_t row = run.first; row < run.last; ++row) {
         connection_.changed_row.reset();
         status = TryRow(source, row, run.returned, outcome.affected);
@@ -254,6 +278,8 @@ Status SqliteQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOu
         if (row + 1 < run.last) failures.push_back({row + 1, NoMemory()});
         break;
     }
+    connection_.changed_table = nullptr;
+    if (entry_.effect == Effect::defines) connection_.Defined();
     if (last_row) outcome.last_row = RowIdOf(*last_row);
     sqlite3_clear_bindings(statement_.get());    // they point to the source's values
     return status;

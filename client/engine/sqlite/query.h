@@ -18,9 +18,7 @@ namespace engine::sqlite {
 
 class SqliteQuery final : public Query {
 public:
-    SqliteQuery(SqliteConnection& connection, StatementHandle statement, std::string_view sql, Effect effect);
-    // The placeholder's values are stored into the column, or compared with it.
-    void UseFor(std::size_t parameter, const Column& column, Coercion::Purpose purpose);
+    SqliteQuery(SqliteConnection& connection, Compilation compilation, std::string_view sql, Effect effect);
     ~SqliteQuery() override;
     SqliteQuery(const SqliteQuery&) = delete;
     SqliteQuery& operator=(const SqliteQuery&) = delete;
@@ -57,6 +55,9 @@ private:
         std::string padded;
     };
 
+    using Coercions = std::vector<std::unique_ptr<Coercion>>;
+    static Coercions CoercionsOf(const ValueTargets& targets, std::size_t parameters);
+    Status FollowSchema();
     Status Bind(int index, const Datum& value, bool copy);
     Status BindDate(int index, const date::DateTime& value, bool copy);
     Status BindRow(RowSource& source, std::uint32_t row, bool copy);
@@ -88,12 +89,14 @@ private:
 
     SqliteConnection& connection_;
     StatementHandle statement_;
+    std::string table_;    // that it changes
+    Schema schema_;        // that it is compiled for
     std::string sql_;
     Verb verb_;
     SqliteConnection::Entry entry_;
     State state_ = State::closed;
     std::vector<Datum> parameters_;
-    std::vector<std::unique_ptr<Coercion>> coercions_;    // by parameter; null where nothing is to be done
+    Coercions coercions_;                 // by parameter; null where its values are taken as they are
     std::vector<DateText> dates_;                         // by parameter; empty until a date is bound
 
     bool described_ = false;

@@ -23,9 +23,10 @@ inline void SetView(Datum& value, Kind kind, const void* data, std::size_t lengt
 // What Enter began is ended if nothing is done in it, and the statement reset, whatever is thrown.
 class Running {
 public:
-    Running(SqliteConnection& connection, sqlite3_stmt* statement) : connection_(connection), statement_(statement) {}
+    Running(SqliteConnection& connection, const StatementHandle& statement)
+        : connection_(connection), statement_(&statement) {}
     ~Running() {
-        if (statement_) sqlite3_reset(statement_);
+        if (statement_) sqlite3_reset(statement_->get());
         if (began) connection_.Abandon();
     }
     Running(const Running&) = delete;
@@ -39,7 +40,7 @@ public:
 
 private:
     SqliteConnection& connection_;
-    sqlite3_stmt* statement_;
+    const StatementHandle* statement_;
 };
 
 }  // namespace engine::sqlite

@@ -12,10 +12,24 @@
 
 namespace engine::sqlite {
 
-// Binds and makes the first step, which a later row's views must not depend on: values are copied.
+// Binds and makes the first step, which a later row's views must not depend on: values are copied. The step is the first
+// to see what other sessions have done to the tables: where SQLite had to compile anew, all of it may have to be. So may
+// a statement whose values were refused before it.
 Status SqliteQuery::Start(RowSource& source, std::uint32_t row, bool& has_row) {
-    Status status = BindRow(source, row, true);
-    if (status.Ok()) status = Step(has_row);
+    Status status;
+    for (bool again = true; again;) {
+        const sqlite3_stmt* const statement = statement_.get();
+        const int recompilations = Recompilations();
+        status = BindRow(source, row, true);
+        const bool is_bound = status.Ok();
+        if (is_bound) status = Step(has_row);
+        else (void)connection_.Ping();
+        again = false;
+        if (is_bound && Recompilations() == recompilations) break;
+        Status followed = FollowSchema();
+        again = statement_.get() != statement;
+        if (again || status.Ok()) status = std::move(followed);
+    }
     if (status.Ok() && has_row) DescribeFromRow();
     else if (status.Ok()) Columns();
     return status;
@@ -24,8 +38,9 @@ Status SqliteQuery::Start(RowSource& source, std::uint32_t row, bool& has_row) {
 Status SqliteQuery::Open(RowSource& source, const QueryRun& run) {
     Close();
     if (connection_.Stopping()) return SqliteConnection::Stopped();
-    Running running(connection_, statement_.get());
+    Running running(connection_, statement_);
     Status status = connection_.Enter(entry_, this, running.began);
+    if (status.Ok()) status = FollowSchema();
     bool has_row = false;
     if (status.Ok()) status = Start(source, run.row, has_row);
     if (!status.Ok()) return status;

@@ -119,6 +119,57 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
     }
 }
 
+// A statement that is compiled once goes with its tables, whoever makes them anew: what its values are for is what the
+// columns are when it runs.
+TEST_F(Sqlite, StatementsFollowTablesMadeAnew) {
+    const struct { const char* type; const char* value; int stored; int found; const char* rows; } cases[] = {
+        {"varchar2(20)", "05-FEB-24", 0, 0, "05-FEB-24;"},
+        {"date", "05-FEB-24", 0, 0, "2024-02-05 00:00:00;"},
+        {"varchar2(20)", "no date", 0, 0, "no date;"},
+        {"number(5,1)", "1.5", 0, 0, "1.5;"},
+        {"number(5,1)", "99999.9", 1438, 0, ""},
+        {"date", "05-XXX-24", 1843, 1843, ""},
+        {"raw(4)", "0a0b", 0, 0, "\n\v;"},
+        {"date", "06-FEB-24", 0, 0, "2024-02-06 00:00:00;"},
+    };
+    const auto other = Connect();
+    for (engine::Connection* maker : {connection_.get(), other.get()}) {
+        std::unique_ptr<engine::Query> insert, query;
+        for (const auto& c : cases) {
+            ASSERT_EQ(Run(*maker, std::string("create table x(a ") + c.type + ")"), 0);
+            if (!insert) insert = Prepared("insert into x values(%1)");
+            if (!query) query = Prepared("select a || '' from x where a = %1");
+            Rows value{{Text(c.value)}};
+            EXPECT_EQ(Execute(*insert, value), c.stored) << c.type;
+            EXPECT_EQ(Answer(connection_->Commit()), 0);
+            EXPECT_EQ(Answer(query->Open(value, {})), c.found) << c.type;
+            EXPECT_EQ(c.found == 0 ? Rest(*query) : "", c.rows) << c.type;
+            ASSERT_EQ(Run(*maker, "drop table x"), 0);
+        }
+        Rows value{{Text("x")}};
+        EXPECT_EQ(Execute(*insert, value), 942);
+        EXPECT_EQ(Answer(query->Open(value, {})), 942);
+    }
+}
+
+// The row that a change touched is one of its own table's, whatever triggers and cascades did.
+TEST_F(Sqlite, RowIdOfAChangeIsOfItsTable) {
+    for (const char* sql : {"create table log(a)", "create table t(a integer primary key)",
+                            "create table c(a integer references t on delete cascade)",
+                            "create trigger i after insert on t begin insert into log values(1); end",
+                            "create trigger d before delete on t begin insert into log values(1); end",
+                            "insert into log values(1)", "insert into log values(1)", "insert into t values(77)", "insert into c values(77)"})
+        ASSERT_EQ(Run(sql), 0) << sql;
+    for (const char* sql : {"insert into T values(76)", "update \"t\" set a = 76 where a = 76",
+                            "insert into t values(76) on conflict do update set a = 76", "delete from t where a = 76"}) {
+        engine::ArrayOutcome outcome;
+        Rows none;
+        ASSERT_TRUE(Prepared(sql)->ExecuteArray(none, {}, outcome).Ok()) << sql;
+        ASSERT_TRUE(outcome.last_row) << sql;
+        EXPECT_EQ(Shown(Row(*outcome.last_row)), "row 0000000000000000004c") << sql;
+    }
+}
+
 TEST_F(Sqlite, ColumnsAreDescribed) {
     ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR (5), d timestamp_tz(3), "
                   "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5))"), 0);
