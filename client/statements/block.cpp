@@ -9,8 +9,28 @@
 
 #include "handles/environment.h"
 #include "handles/errors.h"
+#include "sql/token.h"
 #include "statements/result_set.h"
 #include "statements/statement.h"
+
+namespace {
+
+// What a savepoint step does.
+struct SavepointStep {
+    bool sets = false;    // else goes back to one, or releases it
+    std::string name;
+};
+SavepointStep ReadSavepoint(std::string_view step) {
+    SavepointStep read;
+    sql::Tokenizer tokens(step);
+    sql::Token token = tokens.Next();
+    read.sets = token.Is("savepoint");
+    for (; token.kind == sql::TokenKind::word || token.kind == sql::TokenKind::quoted_word; token = tokens.Next())
+        read.name = sql::UpperCase(sql::PlaceholderName(token.text));    // quoted or not is one to the engine
+    return read;
+}
+
+}  // namespace
 
 // What a block does between ends of transactions. Undone unless it is kept, by an exception, too.
 class Statement::Stretch {
@@ -29,27 +49,37 @@ public:
         return status;
     }
     // To be called after each step, which may have ended the transaction.
-    void Look() noexcept { begun_ = begun_ && engine_.InTransaction(); }
-    // Keeps what is done. A step may have gone back behind the mark; then there is none to drop.
-    Status Keep() {
-        if (!std::exchange(begun_, false)) return {};
-        Status status = engine_.DropMark();
-        return status.Number() == errors::kNoSuchSavepoint ? Status() : status;
+    void Look() noexcept {
+        begun_ = begun_ && engine_.InTransaction();
+        if (!begun_) savepoints_.clear();
     }
+    // Makes room for noting a savepoint step, so that this does not fail.
+    void Reserve() { savepoints_.reserve(savepoints_.size() + 1); }
+    // To be called after a savepoint step. One that was not set in here lies before the mark, which is gone with it:
+    // what follows gets another.
+    void Note(SavepointStep&& step) noexcept {
+        const auto found = std::find(savepoints_.rbegin(), savepoints_.rend(), step.name);
+        if (step.sets) savepoints_.push_back(std::move(step.name));
+        else if (found != savepoints_.rend()) savepoints_.erase(found.base(), savepoints_.end());
+        else begun_ = false;
+        if (!begun_) savepoints_.clear();
+    }
+    // Keeps what is done. Dropping the mark would drop the savepoints behind it, which the application may go back to.
+    Status Keep() { return std::exchange(begun_, false) && savepoints_.empty() ? engine_.DropMark() : Status(); }
     // Ok when nothing is left of it. A mark that could not be gone back to stays.
     Status Undo() {
         Look();
         if (!std::exchange(begun_, false)) return {};
         if (began_transaction_) return engine_.Rollback();
         Status status = engine_.UndoToMark();
-        if (status.Ok()) status = engine_.DropMark();
-        return status.Number() == errors::kNoSuchSavepoint ? Status() : status;
+        return status.Ok() ? engine_.DropMark() : status;
     }
 
 private:
     engine::Connection& engine_;
     bool begun_ = false;
     bool began_transaction_ = false;
+    std::vector<std::string> savepoints_;    // that steps have set, the first one first
 };
 
 Status Statement::RunBlock(const ExecuteArguments& arguments) {
@@ -98,6 +128,7 @@ Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
     if (step.run == sql::Run::change || step.run == sql::Run::savepoint) {
         if (Status status = stretch.Begin(); !status.Ok()) return status;
     }
+    if (step.run == sql::Run::savepoint) return Savepoint(*compiled, step, row, stretch);
     if (!rows.HasTables())
         return IntoTables(step) ? SelectIntoTables(*compiled, step, row) : RunElement(*compiled, step, row, 0);
     std::uint32_t elements = 0;
@@ -112,6 +143,14 @@ Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
     for (const std::uint32_t target : step.targets)
         if (text_.IsBound(target) && text_.At(target)->IsTable()) *text_.At(target)->current_elements = elements;
     return {};
+}
+
+Status Statement::Savepoint(Compiled& compiled, const sql::Step& step, ub4 row, Stretch& stretch) {
+    SavepointStep read = ReadSavepoint(std::string_view(text_.Text()).substr(step.begin, step.end - step.begin));
+    stretch.Reserve();
+    Status status = Change(compiled, step, row, 0);
+    if (status.Ok()) stretch.Note(std::move(read));
+    return status;
 }
 
 bool Statement::IntoTables(const sql::Step& step) const {

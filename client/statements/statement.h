@@ -154,6 +154,7 @@ private:
     Status SelectInto(Compiled& compiled, Targets& targets, ub4 row);
     Status SelectIntoTables(Compiled& compiled, const sql::Step& step, ub4 row);
     Status Change(Compiled& compiled, const sql::Step& step, ub4 row, ub4 element);
+    Status Savepoint(Compiled& compiled, const sql::Step& step, ub4 row, Stretch& stretch);
     [[nodiscard]] bool IntoTables(const sql::Step& step) const;
     void SetReturned(const sql::Step& step, std::uint32_t rows);
 
@@ -166,7 +167,7 @@ private:
     Status EndOfFetch();
 
     // pieces.cpp
-    Status StartFetchInPieces(ub4 rows, const std::uint64_t* position, bool by_execute);
+    Status StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position, bool by_execute);
     Status NextRowInPieces(ub4 row, const std::uint64_t* position);
     Status ContinueFetch();
     Status StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments);
