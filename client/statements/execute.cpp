@@ -199,7 +199,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
 Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     const ub4 rows = arguments.iterations - arguments.first;
     if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) return status;
-    if (defines_.InPieces()) return StartFetchInPieces(rows, nullptr, true);
+    if (defines_.InPieces()) return StartFetchInPieces(rows, arguments.first, nullptr, true);
     Status status = FetchRows(rows, arguments.first, nullptr);
     if (!(arguments.mode & OCI_EXACT_FETCH)) return status;
     bool more = false;

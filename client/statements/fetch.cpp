@@ -38,7 +38,7 @@ Status Statement::FetchNow(ub4 rows, ub2 orientation, sb4 offset) {
     } else if (orientation != OCI_DEFAULT && orientation != OCI_FETCH_NEXT) {
         return Error(errors::kBadFetch);
     }
-    return defines_.InPieces() ? StartFetchInPieces(rows, position, false) : FetchRows(rows, 0, position);
+    return defines_.InPieces() ? StartFetchInPieces(rows, 0, position, false) : FetchRows(rows, 0, position);
 }
 
 // The position of the first row that is wanted of a scrollable cursor; 0 is before them.
@@ -80,10 +80,9 @@ Status Statement::FetchRows(ub4 rows, ub4 first, const std::uint64_t* position) 
     std::uint32_t delivered = 0;
     Status status = position ? run_.cursor.ReadFrom(*position, sink, rows, delivered)
                              : run_.cursor.Read(sink, rows, delivered);
-    if (!status.Ok()) return status;
-    if (delivered < rows) return EndOfFetch();
     run_.row_count = run_.cursor.Reached();
-    return sink.Warned();
+    if (!status.Ok()) return status;
+    return delivered < rows ? EndOfFetch() : sink.Warned();
 }
 
 // A scrollable cursor that delivered something stays on the last row of it.

@@ -140,6 +140,8 @@ Status Statement::GetParameter(ub4 position, dvoid** out) {
     if (!is_ours) {    // none yet, or freed since
         parameter = Create<Parameter>(*this, OCI_DTYPE_PARAM, 0, Share(), position);
         parameters_[position - 1] = parameter;
+        columns = Columns();    // a memory function may have prepared anew
+        if (!columns || position > columns->size()) return Error(errors::kNoParameter);
     }
     parameter->column = (*columns)[position - 1];
     *out = parameter;

@@ -142,10 +142,10 @@ void PieceStream::NextIteration() noexcept {
 
 // ---- Coming out
 
-void PieceStream::StartFetch(ub4 rows, bool by_execute) noexcept {
+void PieceStream::StartFetch(ub4 end, bool by_execute) noexcept {
     End();
     use_ = by_execute ? Use::fetch_by_execute : Use::fetch;
-    arguments_ = {rows, 0, 0};
+    arguments_ = {end, 0, 0};
     wanted_.out = true;
 }
 

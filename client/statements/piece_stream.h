@@ -80,13 +80,13 @@ public:
     void NextIteration() noexcept;
     [[nodiscard]] const ExecuteArguments& Arguments() const { return arguments_; }
 
-    // Coming out: `rows` rows, each Begun before it is handed out.
-    void StartFetch(ub4 rows, bool by_execute) noexcept;
+    // Coming out: rows up to element `end`, each Begun before it is handed out.
+    void StartFetch(ub4 end, bool by_execute) noexcept;
     void Begin(ub4 row, std::span<const engine::Datum> values);
     // Ok when the row is taken; its defines are those of `defines`.
     Status HandOut(const Defines& defines, PieceDriver& driver);
     [[nodiscard]] ub4 Row() const { return wanted_.iteration; }
-    [[nodiscard]] ub4 Rows() const { return arguments_.iterations; }
+    [[nodiscard]] ub4 EndRow() const { return arguments_.iterations; }
 
 private:
     void EndUnlessLiving() noexcept;

@@ -31,9 +31,10 @@ Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) {
 
 // ---- Fetching
 
-Status Statement::StartFetchInPieces(ub4 rows, const std::uint64_t* position, bool by_execute) {
-    pieces_.StartFetch(rows, by_execute);
-    Status status = NextRowInPieces(0, position);
+// `rows` rows into the elements from `first` on.
+Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position, bool by_execute) {
+    pieces_.StartFetch(first + rows, by_execute);
+    Status status = NextRowInPieces(first, position);
     return status.Ok() ? ContinueFetch() : status;
 }
 
@@ -54,7 +55,7 @@ Status Statement::ContinueFetch() {
         ++run_.rows_fetched;
         run_.row_count = run_.cursor.Reached();
         const ub4 next = pieces_.Row() + 1;
-        if (next == pieces_.Rows()) break;
+        if (next == pieces_.EndRow()) break;
         if (Status status = NextRowInPieces(next, nullptr); !status.Ok()) return status;
     }
     pieces_.End();

@@ -106,7 +106,9 @@ Status Statement::MakeBind(OCIBind** handle, std::uint32_t placeholder, bool all
     const auto& share = Share();
     Bind* bind = Reusable<Bind>(*handle, position);
     const bool is_new = !bind;
+    const std::uint32_t changes = text_.Changes();
     if (is_new) bind = Create<Bind>(*this, OCI_HTYPE_BIND, 0);
+    if (text_.Changes() != changes) return Error(errors::kIllegalOperation);    // by a memory function
     BindArea& area = *bind->area;
     Status status = area.Assign(arguments.area, arguments.mode & OCI_DATA_AT_EXEC);
     if (!status.Ok()) {
@@ -157,6 +159,7 @@ Status Statement::DefineByPosition(OCIDefine** handle, ub4 position, const AreaA
         return status;
     }
     pieces_.End();
+    defines_.Reserve(position);    // a memory function may have prepared anew
     define->area->SetOwner(share);
     define->area->position = position;
     *handle = AsHandle<OCIDefine>(define);

@@ -106,6 +106,11 @@ const struct {
          return OCIDefineByPos(o.stmt, &define, o.err, 1, &value, sizeof value, SQLT_INT, nullptr, nullptr, nullptr,
                                OCI_DEFAULT);
      }},
+    {"OCIBindByPos", [](Objects& o) {
+         OCIBind* bind = nullptr;
+         return OCIBindByPos(o.stmt, &bind, o.err, 1, &o.cursor, 0, SQLT_RSET, nullptr, nullptr, nullptr, 0, nullptr,
+                             OCI_DEFAULT);
+     }},
     {"OCIStringAssign", [](Objects& o) { return OCIStringAssign(o.env, o.err, o.source, &o.string); }},
     {"OCIStringResize", [](Objects& o) { return OCIStringResize(o.env, o.err, 100, &o.string); }},
     {"block with a result set", [](Objects& o) {
@@ -126,6 +131,12 @@ const struct {
      [](Objects& o) { OCIHandleFree(o.svc, OCI_HTYPE_SVCCTX); }},
     {"statement", [](const Objects& o) -> const void* { return o.stmt; },
      [](Objects& o) { OCIHandleFree(o.stmt, OCI_HTYPE_STMT); }},
+    {"nothing, but prepares anew", [](const Objects& o) -> const void* { return o.env; },
+     [](Objects& o) {
+         OCIError* own = nullptr;
+         OCIHandleAlloc(o.env, reinterpret_cast<dvoid**>(&own), OCI_HTYPE_ERROR, 0, nullptr);
+         OCIStmtPrepare(o.stmt, own, Text("begin null; end;"), 16, OCI_NTV_SYNTAX, OCI_DEFAULT);
+     }},
     {"string", [](const Objects& o) -> const void* { return o.string; },
      [](Objects& o) {
          OCIString* string = o.string;

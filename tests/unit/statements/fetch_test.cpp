@@ -265,6 +265,7 @@ TEST_F(Fetching, CountsAroundABadRow) {
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 2u);
     EXPECT_EQ(Fetch(2), 1405);
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_FETCHED), 0u);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 3u);
     EXPECT_EQ(Fetch(2), 0);
     EXPECT_STREQ(names_[0], "row 4");
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 5u);

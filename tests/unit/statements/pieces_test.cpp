@@ -116,6 +116,28 @@ TEST_F(PieceByPiece, NullsAreToldThroughTheDefine) {
 }
 
 // A buffer that takes no character is refused with 24307, and the value stays whole for the next.
+// Rows that an execute delivers go into the elements from its offset on, whether values come in pieces or not.
+TEST_F(PieceByPiece, AnExecuteDeliversFromItsOffset) {
+    ASSERT_EQ(Prepare("select 7, 'ab' from dual union all select 8, 'cd' from dual"), 0);
+    sb4 numbers[3] = {-1, -1, -1};
+    ASSERT_EQ(Define(1, {numbers, sizeof numbers[0], SQLT_INT}), 0);
+    ASSERT_EQ(Define(2, {nullptr, 10, SQLT_CHR}, OCI_DYNAMIC_FETCH), 0);
+    const auto execute = [&] { return OCIStmtExecute(svc, stmt, err, 3, 1, nullptr, nullptr, OCI_DEFAULT); };
+    EXPECT_EQ(execute(), OCI_NEED_DATA);
+    for (ub4 element = 1; element < 3; ++element) {
+        ub4 iteration = 0, length = 10;
+        char value[10];
+        ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, nullptr, nullptr, nullptr, &iteration, nullptr, nullptr)), 0);
+        EXPECT_EQ(iteration, element);
+        ASSERT_EQ(Set(value, &length, OCI_ONE_PIECE), 0);
+        EXPECT_EQ(execute(), element == 1 ? OCI_NEED_DATA : OCI_SUCCESS);
+        EXPECT_EQ(std::string(value, length), element == 1 ? "ab" : "cd");
+    }
+    EXPECT_EQ(numbers[0], -1);
+    EXPECT_EQ(numbers[1], 7);
+    EXPECT_EQ(numbers[2], 8);
+}
+
 TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
     const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {
         {"\xc3\xa4z", SQLT_CHR, 1, 2, "\xc3\xa4"},
