@@ -93,12 +93,8 @@ TEST(NumberToText, ModelsThatAreNone) {
 
 TEST(NumberToText, SettingsOfTheNlsText) {
     EXPECT_EQ(Formatted("1234567.5", "9G999G999D99", kGerman), " 1.234.567,50");
-    EXPECT_EQ(Formatted("12", "L999", kGerman),
-              "  \xE2\x82\xAC"
-              "12");
-    EXPECT_EQ(Formatted("12.5", "99L99", kGerman),
-              " 12\xE2\x82\xAC"
-              "50");
+    EXPECT_EQ(Formatted("12", "L999", kGerman), "  \xE2\x82\xAC" "12");
+    EXPECT_EQ(Formatted("12.5", "99L99", kGerman), " 12\xE2\x82\xAC" "50");
     EXPECT_EQ(Formatted("12", "C99U", kGerman), "22061");
     EXPECT_EQ(Formatted("12", "99U", kGerman), " 12DM");
     EXPECT_EQ(Formatted("12", "FM99C", kGerman), "12EUR");
@@ -124,10 +120,7 @@ TEST(NumberFromText, EveryElement) {
     };
     for (const auto& c : cases) EXPECT_EQ(Parsed(c.text, c.model), c.number) << c.text << " by " << c.model;
     EXPECT_EQ(Parsed("1.234,5", "9G999D9", kGerman), "1234.5");
-    EXPECT_EQ(Parsed("\xE2\x82\xAC"
-                     "12",
-                     "L99", kGerman),
-              "12");
+    EXPECT_EQ(Parsed("\xE2\x82\xAC" "12", "L99", kGerman), "12");
     EXPECT_EQ(Parsed("12EUR", "99C", kGerman), "12");
 }
 
