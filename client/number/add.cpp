@@ -1,10 +1,13 @@
 // Addition and subtraction, straight on the base-100 digits.
+#include "number/add_wide.h"
 #include "number/digits.h"
 #include "number/number.h"
 
 namespace number {
 
 namespace {
+
+const bool can_add_wide = CanAddWide();  // false before it is asked, which only costs time
 
 // Whether ShiftRight(digits, count) drops a digit that is not 0.
 bool DropsDigits(const Digits& digits, int count) {
@@ -82,6 +85,10 @@ template <bool kNegative>
 }  // namespace
 
 Errno Add(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
+    return can_add_wide ? AddWide(left, right, result) : AddNarrow(left, right, result);
+}
+
+Errno AddNarrow(const OCINumber& left, const OCINumber& right, OCINumber* result) noexcept {
     if (left.OCINumberPart[1] == right.OCINumberPart[1]) {
         const bool negative = left.OCINumberPart[1] < 128;
         if (negative ? AddAligned<true>(left, right, result) : AddAligned<false>(left, right, result)) return 0;

@@ -1,6 +1,7 @@
 // Arithmetic on numbers, against exact fractions.
 #include <gtest/gtest.h>
 
+#include "number/add_wide.h"
 #include "reference.h"
 
 namespace {
@@ -47,6 +48,29 @@ TEST(NumberArithmetic, FourOperationsRoundTheExactResultOnce) {
             const number::Errno error = operation.function(a, b, &got);
             ASSERT_NO_FATAL_FAILURE(ExpectRounded(operation.name, error, got, exact, Shown(a) + " " + Shown(b)));
         }
+    }
+}
+
+// Both ways of adding, on bytes of which some are malformed: one answer.
+TEST(NumberArithmetic, TheTwoWaysOfAddingAgree) {
+    if (!number::CanAddWide()) GTEST_SKIP() << "this machine has one way only";
+    RandomNumbers numbers(6);
+    for (int i = 0; i < 200000; ++i) {
+        OCINumber operands[2] = {numbers.Next(1), numbers.Next(i % 2)};
+        if (i % 3 == 0) operands[1] = operands[0];
+        for (OCINumber& operand : operands) {
+            constexpr ub1 kBytes[] = {0, 1, 2, 3, 20, 21, 22, 50, 51, 100, 101, 102, 103, 128, 254, 255};
+            if (numbers.Below(4) == 0)
+                operand.OCINumberPart[numbers.Below(numbers.Below(4) ? 22 : 4)] = kBytes[numbers.Below(16)];
+        }
+        OCINumber narrow{{77}}, wide{{77}};
+        const number::Errno narrow_error = number::AddNarrow(operands[0], operands[1], &narrow);
+        ASSERT_EQ(number::AddWide(operands[0], operands[1], &wide), narrow_error)
+            << ::testing::PrintToString(operands[0].OCINumberPart) << ::testing::PrintToString(operands[1].OCINumberPart);
+        ASSERT_EQ(wide, narrow) << Shown(operands[0]) << " + " << Shown(operands[1]);
+        if (narrow_error) continue;
+        ASSERT_EQ(number::AddWide(operands[0], operands[1], &operands[0]), 0);
+        ASSERT_EQ(operands[0], narrow) << "into the first operand";
     }
 }
 
