@@ -51,6 +51,8 @@ TEST(DateToText, EachElement) {
         {"2024-02-09", "DDTH Ddth ddth DDSP DDSPTH Ddspth ddthsp", "09TH 09th 09th NINE NINTH Ninth ninth"},
         {"2024-02-21", "FMDDTH DDSPTH D DSP MMSPTH", "21ST TWENTY-FIRST 4 FOUR SECOND"},
         {"2024-02-11", "DDTH FMMITH", "11TH 0TH"}, {"2024-02-12", "DDspth", "TWELFTH"},
+        {"2024-04-20", "DDDTH DDDspth", "111TH ONE HUNDRED ELEVENTH"}, {"2024-04-21", "DDDTH", "112TH"},
+        {"2024-04-30", "DDDTH", "121ST"}, {"2024-07-29", "DDDTH", "211TH"},
         {"2024-02-20", "DDspth", "TWENTIETH"},
         {"2024-02-29", "Jsp", "Two Million Four Hundred Sixty Thousand Three Hundred Seventy"},
         {"2024-02-09 01:02:03.123456", "SSXFF FF1 FF3 FF6 FF9", "03.123456 1 123 123456 123456000"},
@@ -128,6 +130,8 @@ TEST(DateFromText, Reads) {
         {"May       09, 1999", "FXMonth DD, YYYY", "1999-05-09 00:00:00"},
         {"1999 MAY      ", "FXYYYY MONTH", "1999-05-01 00:00:00"},
         {"1999-05-09  ", "FXYYYY-FXMM-DD", "1999-05-09 00:00:00"}, {"01-JAN-2031", "DD-MON-RR", "2031-01-01 00:00:00"},
+        // Four digits for a short year: just four, and no number behind.
+        {"1404-05", "YY-MM", "1404-05-01 00:00:00"}, {"MAY1404", "MONYY", "1404-05-01 00:00:00"},
     };
     for (const auto& c : cases) EXPECT_EQ(Parse(c.text, c.model), c.value) << c.text << ' ' << c.model;
     EXPECT_EQ(Parse("9. märz 2024", "DD. MONTH YYYY", "german"), "2024-03-09 00:00:00");
@@ -147,6 +151,7 @@ TEST(DateFromText, Refuses) {
         {"2012-01-05", "DD-MON-RR", 1861}, {"2024x02", "YYYY-MM", 1861}, {"2024-ab", "YYYY\"-ac\"", 1861},
         {"2024/02/01", "FXYYYY-MM-DD", 1861}, {"2024-02-01 ", "FXYYYY-MM-DD", 1830},
         {"1999 MAY       ", "FXYYYY MONTH", 1830}, {"2024-2-01", "FXYYYY-MM-DD", 1862}, {"2,24", "Y,YYY", 1862},
+        {"200405", "YY-MM", 1830}, {"0140201", "MM-YY", 1830},
         {"2024-01", "YYYY-MM-DD", 1840}, {"", "YYYY", 1840}, {"2024", "FXYYYY HH24", 1840},
         {"2024-01-01 10", "YYYY-MM-DD", 1830}, {"2024-01-01x", "YYYY-MM-DD", 1830}, {"2024", "YYYQ", 1820},
         {"1", "Q", 1820}, {"1", "DDTH", 1820}, {"one", "DDSP", 1820}, {"20", "CC", 1820}, {"2024", "IYYY", 1820},

@@ -125,7 +125,7 @@ TEST(NumberPlainText, Reads) {
         {"1e126", 1426, ""}, {"1e999999999999", 1426, ""}, {long_whole, 1426, ""},
     };
     for (const auto& c : cases) {
-        OCINumber got;
+        OCINumber got{{21, 193, 8}};  // nothing that a row wants
         ASSERT_EQ(number::FromPlainText(c.text, '.', &got), c.error) << c.text.substr(0, 50);
         if (!c.error) {
             EXPECT_EQ(got, Number(c.number)) << c.text.substr(0, 50);
