@@ -178,6 +178,9 @@ TEST(DateFromText, MissingFieldsAreOfToday) {
     const int century = now.year - now.year % 100;
     ASSERT_EQ(FromText("01-01-07", "DD-MM-YY", kEnglish, Scope::date, &value), 0);
     EXPECT_EQ(value.year, century + 7);
+    ASSERT_EQ(FromText("0412", "YYMM", kEnglish, Scope::date, &value), 0);    // four digits, but a number follows
+    EXPECT_EQ(value.year, century + 4);
+    EXPECT_EQ(value.month, 12);
     // RR: the year of those two digits in the half of a century that lies nearer.
     const bool first_half = now.year % 100 < 50;
     ASSERT_EQ(FromText("01-01-49", "DD-MM-RR", kEnglish, Scope::date, &value), 0);

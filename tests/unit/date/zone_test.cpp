@@ -89,12 +89,13 @@ TEST(Zone, SeesAMomentElsewhere) {
 
 TEST(Zone, TheClockIsThatOfTheProcess) {
     DateTime now;
-    const std::time_t before = std::time(nullptr);
+    timespec before{}, after{};
+    clock_gettime(CLOCK_REALTIME, &before);
     ASSERT_EQ(Now(&now), 0);
-    const std::time_t after = std::time(nullptr);
+    clock_gettime(CLOCK_REALTIME, &after);
     std::tm first{}, last{};
-    localtime_r(&before, &first);
-    localtime_r(&after, &last);
+    localtime_r(&before.tv_sec, &first);
+    localtime_r(&after.tv_sec, &last);
     char text[kMaxEngineText];
     const std::string shown(text, ToEngineText(now, text));
     const auto show = [&](const std::tm& moment) {

@@ -60,6 +60,7 @@ TEST(NumberArithmetic, TheTwoWaysOfAddingAgree) {
         if (i % 3 == 0) operands[1] = operands[0];
         for (OCINumber& operand : operands) {
             constexpr ub1 kBytes[] = {0, 1, 2, 3, 20, 21, 22, 50, 51, 100, 101, 102, 103, 128, 254, 255};
+            if (numbers.Below(100) == 0) operand = OCINumber{{2, operand.OCINumberPart[1], 102}};  // no digit at all
             if (numbers.Below(4) == 0)
                 operand.OCINumberPart[numbers.Below(numbers.Below(4) ? 22 : 4)] = kBytes[numbers.Below(16)];
         }

@@ -113,6 +113,39 @@ TEST(NumberFunctions, NextToMultiplesOfPi) {
     }
 }
 
+// For each weight of the last digit the number of 39 digits that comes nearest: a numerator of the continued fraction of
+// pi/2 in such units.
+TEST(NumberFunctions, NearestToMultiplesOfHalfAPi) {
+    mpz_t last, next, quotient, limit;
+    mpz_inits(last, next, quotient, limit, nullptr);
+    mpz_ui_pow_ui(limit, 10, 39);
+    for (int weight = -38; weight <= 86; ++weight) {
+        Reference rest;
+        mpfr_const_pi(rest, MPFR_RNDN);
+        mpfr_div_2ui(rest, rest, 1, MPFR_RNDN);
+        Reference unit;
+        mpfr_ui_pow_ui(unit, 10, static_cast<unsigned long>(weight < 0 ? -weight : weight), MPFR_RNDN);
+        if (weight < 0)
+            mpfr_mul(rest, rest, unit, MPFR_RNDN);
+        else
+            mpfr_div(rest, rest, unit, MPFR_RNDN);
+        mpz_set_ui(last, 0);
+        mpz_set_ui(next, 1);
+        for (;;) {
+            mpfr_get_z(quotient, rest, MPFR_RNDD);
+            mpz_addmul(last, quotient, next);
+            mpz_swap(last, next);
+            if (mpz_cmp(next, limit) >= 0) break;
+            mpfr_sub_z(rest, rest, quotient, MPFR_RNDN);
+            mpfr_ui_div(rest, 1, rest, MPFR_RNDN);
+        }
+        char digits[64];
+        const OCINumber value = Number(std::string(mpz_get_str(digits, 10, last)) + "E" + std::to_string(weight));
+        for (const Function& row : kFunctions) ASSERT_NO_FATAL_FAILURE(ExpectFunction(row, value));
+    }
+    mpz_clears(last, next, quotient, limit, nullptr);
+}
+
 TEST(NumberFunctions, AtTheEndsOfTheRange) {
     for (const char* value :
          {"0", "1", "-1", "1E-130", "-1E-130", "9.999E125", "-9.999E125", "290", "290.12", "290.2", "-299.3", "-299.4",
