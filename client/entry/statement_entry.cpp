@@ -54,10 +54,11 @@ sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset,
     });
 }
 
-// A handle that a statement made serves no other; one that the application allocated, whoever took it.
+// A handle that a statement made serves no other, and lives no longer than it; one that the application allocated serves
+// whoever took it.
 template <class Handle>
 Statement* StatementOf(const Handle& handle) {
-    if (auto* maker = Live<Statement>(handle.Parent())) return maker;
+    if (handle.Parent() != &handle.Env()) return static_cast<Statement*>(handle.Parent());
     const std::shared_ptr<StatementShare> owner = handle.area->Owner();
     return owner ? owner->Find() : nullptr;
 }

@@ -161,11 +161,10 @@ Status Statement::Complete(Status status, const ExecuteArguments& arguments) {
 // What the engine had to say besides makes success one with information. After a failure its error says enough; an
 // operation that goes on keeps it for its end.
 Status Statement::WithNotices(ErrorHandle& error, Status status) {
-    if (status.Code() == OCI_NEED_DATA) return status;
     Link* const link = UsedLink().get();
     if (!link || link->Closed()) return status;
     if (status.Failed()) link->Answered(status);
-    if (!link->Engine().HasNotices()) return status;
+    if (!link->Engine().HasNotices() || status.Code() == OCI_NEED_DATA) return status;
     std::vector<Status> notices = link->Engine().TakeNotices();
     if (status.Code() != OCI_SUCCESS && status.Code() != OCI_SUCCESS_WITH_INFO) return status;
     if (!status.Ok()) error.list.Add(status);

@@ -1,4 +1,6 @@
 // Statements: fetching rows into the defines.
+#include <utility>
+
 #include "handles/errors.h"
 #include "sessions/link.h"
 #include "statements/fetch_sink.h"
@@ -15,13 +17,16 @@ Status Statement::CheckFetch() {
     return run_.cursor.IsOpen() ? Status() : Error(errors::kFetchOutOfSequence);
 }
 
+// What the engine had to say waits for the end of a fetch that goes on.
 Status Statement::Fetch(ErrorHandle& error, ub4 rows, ub2 orientation, sb4 offset) {
-    return WithNotices(error, FetchNow(rows, orientation, offset));
+    const PieceStream::Use wants = pieces_.Wants();
+    const bool goes_on = wants == PieceStream::Use::fetch || wants == PieceStream::Use::fetch_by_execute;
+    Status status = goes_on ? ContinueFetch() : FetchNow(rows, orientation, offset);
+    if (status.Code() != OCI_NEED_DATA) status = WithNotices(error, std::move(status));
+    return status;
 }
 
 Status Statement::FetchNow(ub4 rows, ub2 orientation, sb4 offset) {
-    const PieceStream::Use wants = pieces_.Wants();
-    if (wants == PieceStream::Use::fetch || wants == PieceStream::Use::fetch_by_execute) return ContinueFetch();
     run_.rows_fetched = 0;
     if (Status status = CheckFetch(); !status.Ok()) return status;
     if (rows == 0) {

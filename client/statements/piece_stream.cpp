@@ -55,10 +55,8 @@ bool SaysNull(const PieceBuffer& piece) {
     return indicator == values::kNullIndicator;
 }
 
-Status PollingDriver::Supply(WantedPiece& wanted, PieceBuffer& place) {
-    place = wanted.area->piece;
-    wanted.area->piece.is_set = false;
-    if (place.is_set) return {};
+Status PollingDriver::Supply(WantedPiece& wanted) {
+    if (std::exchange(wanted.area->piece.is_set, false)) return {};
     if (wanted.asked) return Error(errors::kNoBuffer);
     wanted.asked = true;
     return NeedData(wanted.out ? errors::kWantsBuffer : errors::kWantsPiece);
@@ -120,8 +118,8 @@ Status PieceStream::Collect(PieceDriver& driver) {
         BindArea& bind = *binds_[bind_];
         wanted_.area = &bind;
         wanted_.out = false;
-        PieceBuffer place;
-        if (Status status = driver.Supply(wanted_, place); !status.Ok()) return status;
+        if (Status status = driver.Supply(wanted_); !status.Ok()) return status;
+        const PieceBuffer& place = bind.piece;
         const bool is_null = SaysNull(place);
         if (!is_null) bind.collected.append(static_cast<const char*>(place.buffer), *place.length);
         bind.collected_null = is_null;
@@ -155,65 +153,64 @@ void PieceStream::Begin(ub4 row, std::span<const engine::Datum> values) {
     define_ = 0;
 }
 
-// The next define that takes its value in pieces, and that value; `found` is false at the end of the row.
-Status PieceStream::NextValue(const Defines& defines, bool& found) {
+// The next define that takes its value in pieces, and that value; none is wanted at the end of the row.
+int PieceStream::NextValue(const Defines& defines) {
     const std::vector<Defines::Active>& all = defines.All();
     while (define_ < all.size() && !all[define_].area->InPieces()) ++define_;
-    found = define_ < all.size();
-    if (!found) return {};
+    if (define_ == all.size()) return 0;
     const Defines::Active& active = all[define_++];
     DataArea& area = *active.area;
     const engine::Datum& value = row_[active.column];
     is_null_ = value.kind == engine::Kind::null;
-    whole_ = {};
+    rest_ = {};
     int error = 0;
-    if (!is_null_) error = active.renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, whole_);
+    if (!is_null_) error = active.renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, rest_);
     if (error == 0 && area.Type()->family == values::Family::text)
-        error = values::ToApplication(whole_, area.workspace, whole_);
-    if (error != 0) return Error(error);
-    rest_ = whole_;
+        error = values::ToApplication(rest_, area.workspace, rest_);
+    if (error != 0) return error;
+    whole_ = rest_.size();
     area.piece.is_set = false;
     wanted_.area = &area;
     wanted_.continued = wanted_.asked = false;
     seen_ = defines.Seen();
-    return {};
+    return 0;
 }
 
-Status PieceStream::TakePiece(const PieceBuffer& place, bool& value_ends) {
+int PieceStream::TakePiece(bool& value_ends) {
     const DataArea& area = *wanted_.area;
+    const PieceBuffer& place = area.piece;
     const ub4 row = wanted_.iteration;
     value_ends = true;
     if (is_null_) {
         *place.length = 0;
         TellCode(area, row, place, errors::kNullFetched);
-        return TellIndicator(area, row, place, values::kNullIndicator) ? Status() : Error(errors::kNullFetched);
+        return TellIndicator(area, row, place, values::kNullIndicator) ? 0 : errors::kNullFetched;
     }
     if (const int error = Move(area, place, rest_)) {
         value_ends = false;
-        return Error(error);
+        return error;
     }
     const bool cut = !rest_.empty() && place.piece == OCI_LAST_PIECE;
     TellCode(area, row, place, cut ? errors::kTruncated : 0);
-    TellIndicator(area, row, place, cut ? CutIndicator(whole_.size()) : 0);
+    TellIndicator(area, row, place, cut ? CutIndicator(whole_) : 0);
     value_ends = rest_.empty() || cut;
-    return {};
+    return 0;
 }
 
 Status PieceStream::HandOut(const Defines& defines, PieceDriver& driver) {
     for (;;) {
         if (!wanted_.area) {
-            bool found = false;
-            Status status = NextValue(defines, found);
-            if (status.Failed()) End();
-            if (!status.Ok() || !found) return status;
+            if (const int error = NextValue(defines)) {
+                End();
+                return Error(error);
+            }
+            if (!wanted_.area) return {};
         }
-        PieceBuffer place;
-        if (Status status = driver.Supply(wanted_, place); !status.Ok()) return status;
+        if (Status status = driver.Supply(wanted_); !status.Ok()) return status;
         bool value_ends = false;
-        Status status = TakePiece(place, value_ends);
-        if (!status.Ok()) {
+        if (const int error = TakePiece(value_ends)) {
             if (value_ends) End();    // else another buffer may do
-            return status;
+            return Error(error);
         }
         if (value_ends) wanted_.area = nullptr;
         wanted_.continued = !value_ends;

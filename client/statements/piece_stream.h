@@ -35,15 +35,15 @@ struct WantedPiece {
 class PieceDriver {
 public:
     virtual ~PieceDriver() = default;
-    // Sets the place of the piece. What is not Ok ends the call that is under way: OCI_NEED_DATA until it is made again,
-    // anything else as its error; the piece stays wanted.
-    virtual Status Supply(WantedPiece& wanted, PieceBuffer& place) = 0;
+    // Puts the place of the piece into its area. What is not Ok ends the call that is under way: OCI_NEED_DATA until it
+    // is made again, anything else as its error; the piece stays wanted.
+    virtual Status Supply(WantedPiece& wanted) = 0;
 };
 
 // Takes the places that OCIStmtSetPieceInfo gave.
 class PollingDriver final : public PieceDriver {
 public:
-    Status Supply(WantedPiece& wanted, PieceBuffer& place) override;
+    Status Supply(WantedPiece& wanted) override;
 };
 
 // Whether the application says that the value is null.
@@ -90,8 +90,9 @@ public:
 
 private:
     void EndUnlessLiving() noexcept;
-    Status NextValue(const Defines& defines, bool& found);
-    Status TakePiece(const PieceBuffer& place, bool& value_ends);
+    // Both answer an error's number or 0.
+    int NextValue(const Defines& defines);
+    int TakePiece(bool& value_ends);
 
     Use use_ = Use::none;
     WantedPiece wanted_;
@@ -104,5 +105,6 @@ private:
     OwnRow row_;
     std::size_t define_ = 0;           // the next one to look at
     bool is_null_ = false;
-    std::string_view whole_, rest_;    // the value, and what of it is still to be taken
+    std::size_t whole_ = 0;       // length of the value
+    std::string_view rest_;       // what of it is still to be taken
 };

@@ -50,16 +50,19 @@ Status Statement::NextRowInPieces(ub4 row, const std::uint64_t* position) {
 
 // A row counts when all its pieces are taken.
 Status Statement::ContinueFetch() {
-    for (;;) {
-        if (Status status = pieces_.HandOut(defines_, driver_); !status.Ok()) return status;
+    Status status = pieces_.HandOut(defines_, driver_);
+    while (status.Ok()) {
         ++run_.rows_fetched;
         run_.row_count = run_.cursor.Reached();
         const ub4 next = pieces_.Row() + 1;
-        if (next == pieces_.EndRow()) break;
-        if (Status status = NextRowInPieces(next, nullptr); !status.Ok()) return status;
+        if (next == pieces_.EndRow()) {
+            pieces_.End();
+            break;
+        }
+        status = NextRowInPieces(next, nullptr);
+        if (status.Ok()) status = pieces_.HandOut(defines_, driver_);
     }
-    pieces_.End();
-    return {};
+    return status;
 }
 
 // ---- Executing
