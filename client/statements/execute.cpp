@@ -49,7 +49,9 @@ bool IsForEngine(const sql::Step& step) {
 }  // namespace
 
 Status Statement::Execute(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
-    return WithNotices(error, ExecuteNow(target, error, arguments));
+    Status status = ExecuteNow(target, error, arguments);
+    AddNotices(error, status);
+    return status;
 }
 
 Status Statement::ExecuteNow(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
@@ -160,16 +162,16 @@ Status Statement::Complete(Status status, const ExecuteArguments& arguments) {
 
 // What the engine had to say besides makes success one with information. After a failure its error says enough; an
 // operation that goes on keeps it for its end.
-Status Statement::WithNotices(ErrorHandle& error, Status status) {
+void Statement::AddNotices(ErrorHandle& error, Status& status) {
     Link* const link = UsedLink().get();
-    if (!link || link->Closed()) return status;
+    if (!link || link->Closed()) return;
     if (status.Failed()) link->Answered(status);
-    if (!link->Engine().HasNotices() || status.Code() == OCI_NEED_DATA) return status;
+    if (!link->Engine().HasNotices() || status.Code() == OCI_NEED_DATA) return;
     std::vector<Status> notices = link->Engine().TakeNotices();
-    if (status.Code() != OCI_SUCCESS && status.Code() != OCI_SUCCESS_WITH_INFO) return status;
+    if (status.Code() != OCI_SUCCESS && status.Code() != OCI_SUCCESS_WITH_INFO) return;
     if (!status.Ok()) error.list.Add(status);
     for (std::size_t index = 0; index + 1 < notices.size(); ++index) error.list.Add(notices[index]);
-    return std::move(notices.back());
+    status = std::move(notices.back());
 }
 
 // ---- Queries

@@ -1,6 +1,4 @@
 // Statements: fetching rows into the defines.
-#include <utility>
-
 #include "handles/errors.h"
 #include "sessions/link.h"
 #include "statements/fetch_sink.h"
@@ -22,7 +20,7 @@ Status Statement::Fetch(ErrorHandle& error, ub4 rows, ub2 orientation, sb4 offse
     const PieceStream::Use wants = pieces_.Wants();
     const bool goes_on = wants == PieceStream::Use::fetch || wants == PieceStream::Use::fetch_by_execute;
     Status status = goes_on ? ContinueFetch() : FetchNow(rows, orientation, offset);
-    if (status.Code() != OCI_NEED_DATA) status = WithNotices(error, std::move(status));
+    if (status.Code() != OCI_NEED_DATA) AddNotices(error, status);
     return status;
 }
 

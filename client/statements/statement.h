@@ -143,7 +143,7 @@ private:
     Status RunControl(const ExecuteArguments& arguments);
     Status Finish(ErrorHandle& error, const ExecuteArguments& arguments);
     Status FetchAtExecute(const ExecuteArguments& arguments);
-    Status WithNotices(ErrorHandle& error, Status status);
+    void AddNotices(ErrorHandle& error, Status& status);
 
     // block.cpp
     Status RunBlock(const ExecuteArguments& arguments);

@@ -262,17 +262,19 @@ Status SqliteQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOu
     connection_.changed_table = &table_;
     for (std::uint32_t row = run.first; row < run.last; ++row) {
         connection_.changed_row.reset();
-        status = TryRow(source, row, run.returned, outcome.affected);
-        if (status.Ok()) {
+        Status done = TryRow(source, row, run.returned, outcome.affected);
+        if (done.Ok()) {
             ++outcome.executed;
             running.began = false;
             if (connection_.changed_row) last_row = connection_.changed_row;
             continue;
         }
-        if (in_transaction && !connection_.InTransaction()) break;
-        const bool stops = !run.all_rows || status.Number() == errors::kCancelled;
-        failures.push_back({row, std::move(status)});
-        status = {};
+        if (in_transaction && !connection_.InTransaction()) {
+            status = std::move(done);
+            break;
+        }
+        const bool stops = !run.all_rows || done.Number() == errors::kCancelled;
+        failures.push_back({row, std::move(done)});
         if (stops) break;
         if (HasRoom(failures)) continue;
         if (row + 1 < run.last) failures.push_back({row + 1, NoMemory()});
