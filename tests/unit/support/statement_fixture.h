@@ -4,9 +4,12 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cstring>
 #include <string>
 #include <string_view>
+#include <type_traits>
+#include <utility>
 #include <vector>
 
 #include "kelpci.h"
@@ -51,8 +54,8 @@ protected:
         }
         return encoded;
     }
-    static const OraText* Bytes(const std::string& text) { return reinterpret_cast<const OraText*>(text.data()); }
-    static ub4 Size(const std::string& text) { return static_cast<ub4>(text.size()); }
+    static const OraText* Bytes(std::string_view text) { return reinterpret_cast<const OraText*>(text.data()); }
+    static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
 
     sb4 Answer(sword rc) const {
         sb4 number = 0;
@@ -64,15 +67,23 @@ protected:
         return Answer(OCIStmtPrepare(statement, err, Bytes(text), Size(text), OCI_NTV_SYNTAX, OCI_DEFAULT));
     }
     sb4 Prepare(std::string_view sql) const { return Prepare(stmt, sql); }
+    // Two calls as they answer, for what is told by the return code alone.
+    sword ExecuteCode(ub4 iterations = 1, ub4 mode = OCI_DEFAULT, ub4 first = 0) const {
+        return OCIStmtExecute(svc, stmt, err, iterations, first, nullptr, nullptr, mode);
+    }
+    sword FetchCode(ub4 rows = 1) const { return OCIStmtFetch(stmt, err, rows, OCI_FETCH_NEXT, OCI_DEFAULT); }
     sb4 Execute(ub4 iterations = 1, ub4 mode = OCI_DEFAULT, ub4 first = 0) const {
-        return Answer(OCIStmtExecute(svc, stmt, err, iterations, first, nullptr, nullptr, mode));
+        return Answer(ExecuteCode(iterations, mode, first));
     }
     // Prepares and executes something that is no query.
     sb4 Run(std::string_view sql) const {
         const sb4 prepared = Prepare(sql);
         return prepared != 0 ? prepared : Execute();
     }
-    void MustRun(std::string_view sql) const { ASSERT_EQ(Run(sql), 0) << sql; }
+    template <class... Sql>
+    void MustRun(const Sql&... texts) const {
+        for (const std::string_view sql : {std::string_view(texts)...}) ASSERT_EQ(Run(sql), 0) << sql;
+    }
 
     struct Area {
         dvoid* value;
@@ -81,22 +92,61 @@ protected:
         sb2* indicators = nullptr;
         ub2* lengths = nullptr;
         ub2* codes = nullptr;
+        ub4 mode = OCI_DEFAULT;
     };
+    // Whole numbers, one or an array of them; terminated text, one or an array; and a value that comes in pieces.
+    template <class T>
+    static Area Int(T& place) { return {&place, sizeof(std::remove_all_extents_t<T>), SQLT_INT}; }
+    template <class T, std::size_t N>
+    static Area Int(std::array<T, N>& places) { return {places.data(), sizeof(T), SQLT_INT}; }
+    template <class T>
+    static Area Text(T& place, sb2* indicators = nullptr, ub2* lengths = nullptr, ub2* codes = nullptr) {
+        constexpr std::size_t size = std::rank_v<T> == 2 ? std::extent_v<T, 1> : sizeof(T);
+        return {&place, size, SQLT_STR, indicators, lengths, codes};
+    }
+    static Area InPieces(ub2 type, sb2* indicator = nullptr, ub2* code = nullptr) {
+        return {nullptr, 4000, type, indicator, nullptr, code, OCI_DYNAMIC_FETCH};    // the same bit as for binds
+    }
+
+    sb4 Bind(OCIBind** bind, ub4 position, const Area& area, ub4 mode = OCI_DEFAULT, ub4 most = 0,
+             ub4* current = nullptr) {
+        return Answer(OCIBindByPos(stmt, bind, err, position, area.value, area.size, area.type, area.indicators,
+                                   area.lengths, area.codes, most, current, area.mode | mode));
+    }
     sb4 Bind(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT, ub4 most = 0, ub4* current = nullptr) {
         OCIBind* bind = nullptr;
-        return Answer(OCIBindByPos(stmt, &bind, err, position, area.value, area.size, area.type, area.indicators,
-                                   area.lengths, area.codes, most, current, mode));
+        return Bind(&bind, position, area, mode, most, current);
+    }
+    sb4 BindName(OCIBind** bind, std::string_view name, const Area& area, ub4 most = 0, ub4* current = nullptr) {
+        const std::string text = Encoded(name);
+        return Answer(OCIBindByName(stmt, bind, err, Bytes(text), static_cast<sb4>(text.size()), area.value, area.size,
+                                    area.type, area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT));
     }
     sb4 BindName(std::string_view name, const Area& area, ub4 most = 0, ub4* current = nullptr) {
         OCIBind* bind = nullptr;
-        const std::string text = Encoded(name);
-        return Answer(OCIBindByName(stmt, &bind, err, Bytes(text), static_cast<sb4>(text.size()), area.value, area.size,
-                                    area.type, area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT));
+        return BindName(&bind, name, area, most, current);
+    }
+    sb4 Define(OCIDefine** define, ub4 position, const Area& area, ub4 mode = OCI_DEFAULT) {
+        return Answer(OCIDefineByPos(stmt, define, err, position, area.value, area.size, area.type, area.indicators,
+                                     area.lengths, area.codes, area.mode | mode));
     }
     sb4 Define(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT) {
         OCIDefine* define = nullptr;
-        return Answer(OCIDefineByPos(stmt, &define, err, position, area.value, area.size, area.type, area.indicators,
-                                     area.lengths, area.codes, mode));
+        return Define(&define, position, area, mode);
+    }
+    // Prepares and binds the positions from 1 on.
+    sb4 Ready(std::string_view sql, std::initializer_list<Area> binds) {
+        sb4 answer = Prepare(sql);
+        ub4 position = 0;
+        for (const Area& area : binds) answer = answer == 0 ? Bind(++position, area) : answer;
+        return answer;
+    }
+    // Prepares a query, defines its columns from 1 on, and executes it for so many rows.
+    sb4 Query(std::string_view sql, std::initializer_list<Area> columns, ub4 rows = 1, ub4 mode = OCI_DEFAULT) {
+        sb4 answer = Prepare(sql);
+        ub4 position = 0;
+        for (const Area& area : columns) answer = answer == 0 ? Define(++position, area) : answer;
+        return answer == 0 ? Execute(rows, mode) : answer;
     }
     sb4 Fetch(ub4 rows = 1, ub2 orientation = OCI_FETCH_NEXT, sb4 offset = 0) const {
         return Answer(OCIStmtFetch2(stmt, err, rows, orientation, offset, OCI_DEFAULT));
@@ -108,9 +158,7 @@ protected:
         stmt = New<OCIStmt>(OCI_HTYPE_STMT);
         char text[4001] = "";
         sb2 indicator = 0;
-        sb4 answer = Prepare(sql);
-        if (answer == 0) answer = Define(1, {text, sizeof text, SQLT_STR, &indicator});
-        if (answer == 0) answer = Execute(1);
+        const sb4 answer = Query(sql, {Text(text, &indicator)});
         OCIHandleFree(stmt, OCI_HTYPE_STMT);
         stmt = outer;
         if (answer != 0) return "!" + std::to_string(answer);
@@ -122,6 +170,22 @@ protected:
         EXPECT_EQ(Answer(OCIAttrGet(handle ? handle : stmt, type, &value, nullptr, attribute, err)), 0) << attribute;
         return value;
     }
+
+    dvoid* Column(ub4 position) const {
+        dvoid* parameter = nullptr;
+        EXPECT_EQ(Answer(OCIParamGet(stmt, OCI_HTYPE_STMT, err, &parameter, position)), 0) << position;
+        return parameter;
+    }
+    std::string_view ColumnName(dvoid* parameter) const {
+        OraText* name = nullptr;
+        ub4 length = 0;
+        EXPECT_EQ(Answer(OCIAttrGet(parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, err)), 0);
+        return {reinterpret_cast<const char*>(name), length};
+    }
+    ub4 RowCount() const { return Attribute<ub4>(OCI_ATTR_ROW_COUNT); }
+    ub4 RowsFetched() const { return Attribute<ub4>(OCI_ATTR_ROWS_FETCHED); }
+    ub4 State() const { return Attribute<ub4>(OCI_ATTR_STMT_STATE); }
+    ub4 FailedRow() const { return Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, err, OCI_HTYPE_ERROR); }
 
     OCIEnv* env = nullptr;
     OCIError* err = nullptr;
