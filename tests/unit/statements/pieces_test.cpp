@@ -8,43 +8,157 @@ class PieceByPiece : public StatementTest {
 protected:
     explicit PieceByPiece(ub4 mode = OCI_DEFAULT) : StatementTest(mode) {}
 
-    // Gives the place of the next piece.
-    sb4 Set(void* buffer, ub4* length, ub1 piece, sb2* indicator = nullptr, ub2* code = nullptr) const {
+    struct Wanted {
         dvoid* handle = nullptr;
         ub4 type = 0;
-        sb4 answer = Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &type, nullptr, nullptr, nullptr, nullptr));
-        if (answer != 0) return answer;
-        return Answer(OCIStmtSetPieceInfo(handle, type, err, buffer, length, piece, indicator, code));
+        ub1 direction = 0;
+        ub4 iteration = 9, index = 9;
+        ub1 piece = 9;
+    };
+    sb4 Get(Wanted& wanted) const {
+        return Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &wanted.direction,
+                                          &wanted.iteration, &wanted.index, &wanted.piece));
+    }
+    // Gives the place of the next piece.
+    sb4 Set(const void* buffer, ub4* length, ub1 piece, sb2* indicator = nullptr, ub2* code = nullptr) const {
+        Wanted wanted;
+        const sb4 answer = Get(wanted);
+        return answer != 0 ? answer : Answer(OCIStmtSetPieceInfo(wanted.handle, wanted.type, err, buffer, length, piece,
+                                                                 indicator, code));
     }
     // One more piece of at most `room` bytes, and what the fetch that takes it answers.
     std::string Piece(ub4 room, sword& rc, ub1 piece = OCI_NEXT_PIECE, sb2* indicator = nullptr, ub2* code = nullptr) {
         std::string buffer(room + 1, '#');
         EXPECT_EQ(Set(buffer.data(), &room, piece, indicator, code), 0);
-        rc = OCIStmtFetch(stmt, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT);
+        rc = FetchCode();
         EXPECT_LE(room, buffer.size());
         return buffer.substr(0, room);
     }
-    sword FetchOne() const { return OCIStmtFetch(stmt, err, 1, OCI_FETCH_NEXT, OCI_DEFAULT); }
+    // A query whose first row waits for a piece.
+    void Begin(const std::string& sql, std::initializer_list<Area> columns) {
+        ASSERT_EQ(Query(sql, columns, 0), 0) << sql;
+        ASSERT_EQ(FetchCode(), OCI_NEED_DATA) << sql;
+    }
 };
+
+// The cycle of a program that prints whole rows: one piece a column, the last fetch of a row answers 0.
+TEST_F(PieceByPiece, OneCycleARow) {
+    MustRun("create table t(id number, name varchar2(40))", "insert into t values(2, 'row 2'), (3, null)");
+    ASSERT_EQ(Query("select id, name from t order by id", {}, 0), 0);
+    OCIDefine* defines[2] = {};
+    for (ub4 column = 0; column < 2; ++column)
+        ASSERT_EQ(Define(&defines[column], column + 1, InPieces(SQLT_STR)), 0);
+    const char* expected[2][2] = {{"2", "row 2"}, {"3", nullptr}};
+    for (const auto& row : expected) {
+        ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
+        for (ub4 column = 0; column < 2; ++column) {
+            Wanted wanted;
+            ASSERT_EQ(Get(wanted), 0);
+            EXPECT_EQ(wanted.handle, defines[column]);
+            EXPECT_EQ(wanted.type, ub4{OCI_HTYPE_DEFINE});
+            EXPECT_EQ(wanted.direction, OCI_PARAM_OUT);
+            sb2 indicator = 9;
+            ub2 code = 9;
+            sword rc = 0;
+            EXPECT_EQ(Piece(1000, rc, wanted.piece, &indicator, &code), row[column] ? row[column] : "");
+            EXPECT_EQ(rc, column == 0 ? OCI_NEED_DATA : OCI_SUCCESS);
+            EXPECT_EQ(indicator, row[column] ? 0 : -1);
+            EXPECT_EQ(code, row[column] ? 0 : 1405);
+        }
+        EXPECT_EQ(RowsFetched(), 1u);
+    }
+    EXPECT_EQ(FetchCode(), OCI_NO_DATA);
+}
+
+TEST_F(PieceByPiece, LongValueComesInSeveral) {
+    Begin("select 'abcdefgh' from dual", {InPieces(SQLT_CHR)});
+    std::string whole;
+    sword rc = OCI_NEED_DATA;
+    for (ub1 asked = OCI_ONE_PIECE; rc == OCI_NEED_DATA && whole.size() < 20; asked = OCI_NEXT_PIECE) {
+        EXPECT_EQ(Fetch(), 3131) << "no buffer was given";
+        Wanted wanted;
+        ASSERT_EQ(Get(wanted), 0);
+        EXPECT_EQ(wanted.piece, asked);
+        char buffer[3];
+        ub4 length = sizeof buffer;
+        EXPECT_EQ(Set(nullptr, &length, asked), 24306);
+        EXPECT_EQ(Set(buffer, nullptr, asked), 24307);
+        EXPECT_EQ(Set(buffer, &length, 7), 24370);
+        whole += Piece(3, rc, asked);
+    }
+    EXPECT_EQ(rc, OCI_SUCCESS);
+    EXPECT_EQ(whole, "abcdefgh");
+}
+
+TEST_F(PieceByPiece, OnlySomeTypes) {
+    for (const ub2 type : {SQLT_INT, SQLT_FLT, SQLT_VNU, SQLT_DAT, SQLT_VCS, SQLT_CUR}) {
+        char area[8];
+        ASSERT_EQ(Prepare("select :1 from dual"), 0);
+        EXPECT_EQ(Define(1, {area, 8, type}, OCI_DYNAMIC_FETCH), 24304) << type;
+        EXPECT_EQ(Bind(1, {area, 8, type}, OCI_DATA_AT_EXEC), 24304) << type;
+    }
+}
+
+TEST_F(PieceByPiece, ExecuteAsksForEachValueOfEachRow) {
+    MustRun("create table u(a number, b varchar2(100), c raw(10))");
+    sb4 numbers[2] = {1, 2};
+    ASSERT_EQ(Ready("insert into u values(:1, :2, :3)", {Int(numbers), InPieces(SQLT_CHR), InPieces(SQLT_BIN)}), 0);
+    const struct { ub4 iteration; const char* data; ub1 piece; ub1 asked; } steps[] = {
+        {0, "first", OCI_FIRST_PIECE, OCI_ONE_PIECE}, {0, " and last", OCI_LAST_PIECE, OCI_NEXT_PIECE},
+        {0, "\x01\x02", OCI_ONE_PIECE, OCI_ONE_PIECE}, {1, nullptr, OCI_ONE_PIECE, OCI_ONE_PIECE},
+        {1, "\x03", OCI_ONE_PIECE, OCI_ONE_PIECE}};
+    sword rc = ExecuteCode(2);
+    for (const auto& step : steps) {
+        ASSERT_EQ(rc, OCI_NEED_DATA);
+        EXPECT_EQ(Fetch(), 3127) << "an execute is not finished";
+        Wanted wanted;
+        ASSERT_EQ(Get(wanted), 0);
+        EXPECT_EQ(wanted.type, ub4{OCI_HTYPE_BIND});
+        EXPECT_EQ(wanted.direction, OCI_PARAM_IN);
+        EXPECT_EQ(wanted.iteration, step.iteration);
+        EXPECT_EQ(wanted.piece, step.asked);
+        sb2 indicator = step.data ? 0 : -1;
+        ub4 length = step.data ? Size(step.data) : 0;
+        ASSERT_EQ(Set(step.data, &length, step.piece, &indicator), 0);
+        rc = ExecuteCode(2);
+    }
+    EXPECT_EQ(rc, OCI_SUCCESS);
+    EXPECT_EQ(RowCount(), 2u);
+    EXPECT_EQ(One("select group_concat(a || ':' || coalesce(b, '-') || ':' || hex(c), '/') from u"),
+              "1:first and last:0102/2:-:03");
+}
+
+TEST_F(PieceByPiece, NothingIsWanted) {
+    sb4 number = 0;
+    ub4 length = 1;
+    char buffer[1];
+    OCIDefine* define = nullptr;
+    ASSERT_EQ(Query("select 1 from dual", {Int(number)}, 0), 0);
+    Wanted wanted;
+    EXPECT_EQ(Get(wanted), 24370);
+    ASSERT_EQ(Define(&define, 1, Int(number)), 0);
+    const auto set = [&](ub4 type) {
+        return OCIStmtSetPieceInfo(define, type, err, buffer, &length, 0, nullptr, nullptr);
+    };
+    EXPECT_EQ(Answer(set(OCI_HTYPE_DEFINE)), 24370);
+    for (const ub4 type : {OCI_HTYPE_BIND, 99}) EXPECT_EQ(set(type), OCI_INVALID_HANDLE) << type;
+}
 
 // Other statements of the session insert, select and commit while a row waits for its next piece: its bytes stay.
 TEST_F(PieceByPiece, ARowThatWaitsKeepsItsBytes) {
     MustRun("create table t(id number, a varchar2(4000), b varchar2(4000), c varchar2(40))");
     for (const char* row : {"1, 'a", "2, 'x"}) {
         const char* const letter = row + 4;
-        MustRun("insert into t select " + std::string(row, 3) + "replace(hex(zeroblob(1000)), '0', '" + letter + "'), " +
-                "replace(hex(zeroblob(1000)), '0', 'B" + letter + "'), 'plain" + std::string(letter) + "' from dual");
+        const std::string filled = "replace(hex(zeroblob(1000)), '0', '";
+        MustRun("insert into t select " + std::string(row, 3) + filled + letter + "'), " + filled + "B" + letter +
+                "'), 'plain" + letter + "' from dual");
     }
     char plain[20] = "";
-    ASSERT_EQ(Prepare("select c, a, b from t order by id"), 0);
-    ASSERT_EQ(Define(1, {plain, sizeof plain, SQLT_STR}), 0);
-    ASSERT_EQ(Define(2, {nullptr, 4000, SQLT_CHR}, OCI_DYNAMIC_FETCH), 0);
-    ASSERT_EQ(Define(3, {nullptr, 4000, SQLT_CHR}, OCI_DYNAMIC_FETCH), 0);
-    ASSERT_EQ(Execute(0), 0);
+    ASSERT_EQ(Query("select c, a, b from t order by id", {Text(plain), InPieces(SQLT_CHR), InPieces(SQLT_CHR)}, 0), 0);
     OCIStmt* const query = stmt;
     OCIStmt* const other = New<OCIStmt>(OCI_HTYPE_STMT);
     for (const char letter : {'a', 'x'}) {
-        ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+        ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
         EXPECT_EQ(plain, std::string("plain") + letter);
         std::string values[2];
         for (std::string& value : values) {
@@ -65,14 +179,11 @@ TEST_F(PieceByPiece, ARowThatWaitsKeepsItsBytes) {
     }
 }
 
-// A value is cut by LAST: the indicator tells its whole length as long as it can.
+// A value is cut by LAST: the indicator tells its whole length as long as it can, and the rest of the row follows.
 TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
     const struct { int whole; sb2 indicator; } cases[] = {{4, 4}, {32766, 32766}, {32767, 32767}, {32768, -2}};
     for (const auto& c : cases) {
-        ASSERT_EQ(Prepare("select printf('%.*c', " + std::to_string(c.whole) + ", 'x') from dual"), 0);
-        ASSERT_EQ(Define(1, {nullptr, 1, SQLT_CHR}, OCI_DYNAMIC_FETCH), 0);
-        ASSERT_EQ(Execute(0), 0);
-        ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+        Begin("select printf('%.*c', " + std::to_string(c.whole) + ", 'x') from dual", {InPieces(SQLT_CHR)});
         sb2 indicator = 9;
         ub2 code = 9;
         sword rc = 0;
@@ -81,22 +192,31 @@ TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
         EXPECT_EQ(indicator, c.indicator) << c.whole;
         EXPECT_EQ(code, 1406) << c.whole;
     }
+    char other[4] = "", buffer[3];
+    ub4 length = sizeof buffer;
+    ASSERT_EQ(Query("select 'abcdefgh', 'x' from dual", {InPieces(SQLT_LNG), Text(other)}, 0), 0);
+    ASSERT_EQ(ExecuteCode(1), OCI_NEED_DATA);
+    sb2 indicator = 0;
+    ub2 code = 0;
+    ASSERT_EQ(Set(buffer, &length, OCI_LAST_PIECE, &indicator, &code), 0);
+    EXPECT_EQ(Execute(1), 0) << "the execute that began goes on";
+    EXPECT_EQ(std::string(buffer, length), "abc");
+    EXPECT_EQ(indicator, 8);
+    EXPECT_EQ(code, 1406);
+    EXPECT_STREQ(other, "x");
 }
 
 // Where SetPieceInfo gives no indicator or code, those of the define are told; the rest of the row follows.
 TEST_F(PieceByPiece, NullsAreToldThroughTheDefine) {
-    MustRun("create table t(id number, a varchar2(10), b varchar2(10))");
-    MustRun("insert into t values(1, null, 'one')");
-    MustRun("insert into t values(2, 'a', null)");
+    MustRun("create table t(id number, a varchar2(10), b varchar2(10))",
+            "insert into t values(1, null, 'one'), (2, 'a', null)");
     sb2 a = 9, b = 9;
     ub2 a_code = 9, b_code = 9;
-    ASSERT_EQ(Prepare("select a, b from t order by id"), 0);
-    ASSERT_EQ(Define(1, {nullptr, 10, SQLT_CHR, &a, nullptr, &a_code}, OCI_DYNAMIC_FETCH), 0);
-    ASSERT_EQ(Define(2, {nullptr, 10, SQLT_CHR, &b, nullptr, &b_code}, OCI_DYNAMIC_FETCH), 0);
-    ASSERT_EQ(Execute(0), 0);
+    ASSERT_EQ(Query("select a, b from t order by id",
+                    {InPieces(SQLT_CHR, &a, &a_code), InPieces(SQLT_CHR, &b, &b_code)}, 0), 0);
     const struct { const char *a, *b; sb2 a_indicator, b_indicator; } rows[] = {{"", "one", -1, 0}, {"a", "", 0, -1}};
     for (const auto& row : rows) {
-        ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+        ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
         sword rc = 0;
         EXPECT_EQ(Piece(10, rc), row.a);
         EXPECT_EQ(rc, OCI_NEED_DATA) << "the rest of the row is not lost";
@@ -107,9 +227,7 @@ TEST_F(PieceByPiece, NullsAreToldThroughTheDefine) {
         EXPECT_EQ(b, row.b_indicator);
         EXPECT_EQ(b_code, row.b_indicator == 0 ? 0 : 1405);
     }
-    ASSERT_EQ(Define(1, {nullptr, 10, SQLT_CHR}, OCI_DYNAMIC_FETCH), 0);
-    ASSERT_EQ(Execute(0), 0);
-    ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+    Begin("select a, b from t order by id", {InPieces(SQLT_CHR)});
     sword rc = 0;
     EXPECT_EQ(Piece(10, rc), "");
     EXPECT_EQ(Answer(rc), 1405) << "there is no indicator at all";
@@ -140,18 +258,12 @@ TEST_F(PieceByPiece, AnExecuteDeliversFromItsOffset) {
 
 TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
     const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {
-        {"\xc3\xa4z", SQLT_CHR, 1, 2, "\xc3\xa4"},
-        {"\xe2\x82\xacz", SQLT_CHR, 2, 3, "\xe2\x82\xac"},
-        {"a\xe2\x82\xacz", SQLT_CHR, 0, 3, "a"},
-        {"az", SQLT_STR, 0, 2, "a"},
-        {"az", SQLT_STR, 1, 2, "a"},
+        {"\xc3\xa4z", SQLT_CHR, 1, 2, "\xc3\xa4"}, {"\xe2\x82\xacz", SQLT_CHR, 2, 3, "\xe2\x82\xac"},
+        {"a\xe2\x82\xacz", SQLT_CHR, 0, 3, "a"}, {"az", SQLT_STR, 0, 2, "a"}, {"az", SQLT_STR, 1, 2, "a"},
         {"\xc3\xa4z", SQLT_STR, 2, 3, "\xc3\xa4"},
     };
     for (const auto& c : cases) {
-        ASSERT_EQ(Prepare("select '" + std::string(c.value) + "' from dual"), 0);
-        ASSERT_EQ(Define(1, {nullptr, 10, c.type}, OCI_DYNAMIC_FETCH), 0);
-        ASSERT_EQ(Execute(0), 0);
-        ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+        Begin("select '" + std::string(c.value) + "' from dual", {InPieces(c.type)});
         char buffer[8] = "";
         ub4 length = c.too_small;
         sb2 indicator = 0;
@@ -161,8 +273,7 @@ TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
         sword rc = 0;
         EXPECT_EQ(Piece(c.enough, rc), c.first) << c.value << " in " << c.enough;
         ASSERT_EQ(rc, OCI_NEED_DATA) << c.value;
-        const std::string rest = std::string(c.value).substr(std::strlen(c.first));
-        EXPECT_EQ(Piece(8, rc), rest);
+        EXPECT_EQ(Piece(8, rc), c.value + std::strlen(c.first));
         EXPECT_EQ(rc, OCI_SUCCESS);
     }
 }
@@ -170,22 +281,19 @@ TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
 // The null of one row is not that of the next; text of a terminated type ends at its zero, other text does not.
 TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
     MustRun("create table t(a varchar2(10), b raw(10))");
-    ASSERT_EQ(Prepare("insert into t values(:1, :2)"), 0);
-    ASSERT_EQ(Bind(1, {nullptr, 10, SQLT_STR}, OCI_DATA_AT_EXEC), 0);
-    ASSERT_EQ(Bind(2, {nullptr, 10, SQLT_BIN}, OCI_DATA_AT_EXEC), 0);
-    char zero_inside[] = {'a', 'b', 0, 'c'};
-    sword rc = OCIStmtExecute(svc, stmt, err, 2, 0, nullptr, nullptr, OCI_DEFAULT);
+    ASSERT_EQ(Ready("insert into t values(:1, :2)", {InPieces(SQLT_STR), InPieces(SQLT_BIN)}), 0);
+    sword rc = ExecuteCode(2);
     for (const sb2 given : {-1, 0}) {
         for (int column = 0; column < 2; ++column) {
             ASSERT_EQ(rc, OCI_NEED_DATA);
             sb2 indicator = given;
             ub4 length = 4;
-            ASSERT_EQ(Set(zero_inside, &length, OCI_ONE_PIECE, &indicator), 0);
-            rc = OCIStmtExecute(svc, stmt, err, 2, 0, nullptr, nullptr, OCI_DEFAULT);
+            ASSERT_EQ(Set("ab\0c", &length, OCI_ONE_PIECE, &indicator), 0);
+            rc = ExecuteCode(2);
         }
     }
     ASSERT_EQ(rc, OCI_SUCCESS);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 2u);
+    EXPECT_EQ(RowCount(), 2u);
     EXPECT_EQ(One("select group_concat(coalesce(a, '-') || ':' || coalesce(hex(b), '-'), '/') from t"),
               "-:/ab:61620063");
 }
@@ -193,18 +301,14 @@ TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
 // Of an execute in pieces that stops, the rows before are done and counted.
 TEST_F(PieceByPiece, ARowThatFails) {
     MustRun("create table t(a varchar2(10) primary key)");
-    ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
-    ASSERT_EQ(Bind(1, {nullptr, 10, SQLT_CHR}, OCI_DATA_AT_EXEC), 0);
-    sword rc = OCIStmtExecute(svc, stmt, err, 3, 0, nullptr, nullptr, OCI_DEFAULT);
-    for (const char* value : {"x", "x"}) {
-        ASSERT_EQ(rc, OCI_NEED_DATA);
-        ub4 length = 1;
-        ASSERT_EQ(Set(const_cast<char*>(value), &length, OCI_ONE_PIECE), 0);
-        rc = OCIStmtExecute(svc, stmt, err, 3, 0, nullptr, nullptr, OCI_DEFAULT);
+    ASSERT_EQ(Ready("insert into t values(:1)", {InPieces(SQLT_CHR)}), 0);
+    for (ub4 row = 0, length = 1; row < 2; ++row) {
+        ASSERT_EQ(ExecuteCode(3), OCI_NEED_DATA);
+        ASSERT_EQ(Set("x", &length, OCI_ONE_PIECE), 0);
     }
-    EXPECT_EQ(Answer(rc), 1);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROW_COUNT), 1u);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, err, OCI_HTYPE_ERROR), 1u);
+    EXPECT_EQ(Execute(3), 1);
+    EXPECT_EQ(RowCount(), 1u);
+    EXPECT_EQ(FailedRow(), 1u);
     EXPECT_EQ(One("select count(*) from t"), "1");
 }
 
@@ -212,18 +316,17 @@ TEST_F(PieceByPiece, ARowThatFails) {
 TEST_F(PieceByPiece, HandlesThatAreFreedMeanwhile) {
     ASSERT_EQ(Prepare("select 'abc' from dual"), 0);
     OCIDefine* define = nullptr;
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, nullptr, 9, SQLT_CHR, nullptr, nullptr, nullptr,
-                                    OCI_DYNAMIC_FETCH)), 0);
+    ASSERT_EQ(Define(&define, 1, InPieces(SQLT_CHR)), 0);
     ASSERT_EQ(Execute(0), 0);
-    ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+    ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
     ASSERT_EQ(OCIHandleFree(define, OCI_HTYPE_DEFINE), OCI_SUCCESS);
-    EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr)), 24370);
+    Wanted wanted;
+    EXPECT_EQ(Get(wanted), 24370);
     EXPECT_EQ(Fetch(), 24374);
     ASSERT_EQ(Prepare("select :1 from dual"), 0);
     OCIBind* bind = nullptr;
-    ASSERT_EQ(Answer(OCIBindByPos(stmt, &bind, err, 1, nullptr, 9, SQLT_CHR, nullptr, nullptr, nullptr, 0, nullptr,
-                                  OCI_DATA_AT_EXEC)), 0);
-    ASSERT_EQ(OCIStmtExecute(svc, stmt, err, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_NEED_DATA);
+    ASSERT_EQ(Bind(&bind, 1, InPieces(SQLT_CHR)), 0);
+    ASSERT_EQ(ExecuteCode(0), OCI_NEED_DATA);
     ASSERT_EQ(OCIHandleFree(bind, OCI_HTYPE_BIND), OCI_SUCCESS);
     EXPECT_EQ(Execute(0), 1008);
 }
@@ -235,22 +338,20 @@ protected:
 
 // Two zero bytes close a terminated piece; neither a unit nor a pair of them is torn.
 TEST_F(Utf16Pieces, EndBetweenCharacters) {
-    const struct { const char* value; ub2 type; ub4 room; std::u16string_view first; std::string_view closed; } cases[] = {
-        {"'ab'", SQLT_STR, 4, u"a", std::string_view("\0\0", 2)},
-        {"'ab'", SQLT_STR, 5, u"a", std::string_view("\0\0", 2)},
+    using std::string_view;
+    const struct { const char* value; ub2 type; ub4 room; std::u16string_view first; string_view closed; } cases[] = {
+        {"'ab'", SQLT_STR, 4, u"a", string_view("\0\0", 2)},
+        {"'ab'", SQLT_STR, 5, u"a", string_view("\0\0", 2)},
         {"'ab'", SQLT_CHR, 3, u"a", "#"},
         {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 4, u"a", "#"},
         {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 6, u"a\U0001F600", "#"},
     };
     for (const auto& c : cases) {
-        ASSERT_EQ(Prepare(std::string("select ") + c.value + " from dual"), 0);
-        ASSERT_EQ(Define(1, {nullptr, 10, c.type}, OCI_DYNAMIC_FETCH), 0);
-        ASSERT_EQ(Execute(0), 0);
-        ASSERT_EQ(FetchOne(), OCI_NEED_DATA);
+        Begin(std::string("select ") + c.value + " from dual", {InPieces(c.type)});
         std::string buffer(10, '#');
         ub4 length = c.room;
         ASSERT_EQ(Set(buffer.data(), &length, OCI_NEXT_PIECE), 0);
-        EXPECT_EQ(FetchOne(), OCI_NEED_DATA) << c.value;
+        EXPECT_EQ(FetchCode(), OCI_NEED_DATA) << c.value;
         const std::string_view first(reinterpret_cast<const char*>(c.first.data()), c.first.size() * 2);
         EXPECT_EQ(buffer.substr(0, length), first) << c.value << " in " << c.room;
         EXPECT_EQ(buffer.substr(length, c.closed.size()), c.closed) << c.value << " in " << c.room;
