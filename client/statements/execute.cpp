@@ -286,9 +286,6 @@ Status Statement::RunOnce(const ExecuteArguments& arguments) {
     if (!compiled->query->Columns().empty() && !is_definition) return RunQuery(arguments);
     if (Status status = CheckOnce(arguments); !status.Ok()) return status;
     if (Status status = CompileForValues(compiled); !status.Ok()) return status;
-    if (run == sql::Run::savepoint) {    // one outside of a transaction would be one
-        if (Status status = Engine().Begin(engine::TransactionMode::read_write); !status.Ok()) return status;
-    }
     engine::ArrayOutcome outcome;
     Status status = compiled->query->ExecuteArray(compiled->rows, {}, outcome);
     if (status.Ok() && !outcome.failures.empty()) return std::move(outcome.failures.front().status);

@@ -104,6 +104,28 @@ TEST_F(Sessions, EndOfASessionCommitsAndLossOfItDoesNot) {
     ASSERT_EQ(Answer(OCILogoff(svc_, err_)), 0);
 }
 
+// What fails outside of a transaction leaves none behind: nobody has to wait for it.
+TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
+    const std::string file = folder_ + "/x.db";
+    ASSERT_EQ(LogOn("", "", file), 0);
+    ASSERT_EQ(Run("create table t(a number unique)"), 0);
+    OCISvcCtx* const first = std::exchange(svc_, nullptr);
+    ASSERT_EQ(LogOn("", "", file), 0);
+    OCISvcCtx* const second = svc_;
+    const struct { const char* sql; sb4 answer; } cases[] = {
+        {"rollback to nowhere", 1086}, {"release nowhere", 1086}, {"insert into t values('x')", 1722},
+        {"begin insert into t values(1); insert into t values(1); end;", 1}, {"begin rollback to nowhere; end;", 1086},
+    };
+    for (const auto& c : cases) {
+        svc_ = first;
+        EXPECT_EQ(Run(c.sql), c.answer) << c.sql;
+        svc_ = second;
+        EXPECT_EQ(Run("insert into t values(9)"), 0) << c.sql;
+        EXPECT_EQ(Run("rollback"), 0);
+    }
+    for (OCISvcCtx* svc : {first, second}) EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+}
+
 TEST_F(Sessions, ServerInMemoryKeepsItsTablesFromSessionToSession) {
     Attach(":memory:");
     ASSERT_EQ(Begin("ann", "secret"), 0);
