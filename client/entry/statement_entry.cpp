@@ -49,7 +49,6 @@ Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length
 
 sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
     return EnterWithError<Statement>(stmt, err, [&](Statement& statement, ErrorHandle& error) {
-        const LongCall may_take_long;
         return mode == OCI_DEFAULT ? statement.Fetch(error, rows, orientation, offset) : Error(errors::kBadMode);
     });
 }

@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "handles/in_flight.h"
+
 namespace {
 
 // Rows that nobody wants.
@@ -40,6 +42,7 @@ Status Cursor::Read(CountedSink& sink, std::uint32_t most, std::uint32_t& delive
     delivered = 0;
     if (scrollable_) return ReadFrom(position_ + 1, sink, most, delivered);
     if (at_end_ || most == 0) return {};
+    const LongCall may_take_long;
     bool more = true;
     const std::uint32_t before = sink.rows;
     Status status = query_->Fetch(sink, most, more);
@@ -50,6 +53,7 @@ Status Cursor::Read(CountedSink& sink, std::uint32_t most, std::uint32_t& delive
 }
 
 Status Cursor::ReadFrom(std::uint64_t position, CountedSink& sink, std::uint32_t most, std::uint32_t& delivered) {
+    const LongCall may_take_long;
     const std::uint32_t before = sink.rows;
     bool found = false;
     delivered = 0;
@@ -79,6 +83,7 @@ Status Cursor::AnyMore(bool& more) {
 }
 
 Status Cursor::Count(std::uint64_t& rows) {
+    const LongCall may_take_long;
     Status status = query_->Count(rows);
     if (status.Ok()) reached_ = rows;
     return status;

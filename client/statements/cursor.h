@@ -1,7 +1,7 @@
 // A cursor: where the application stands in the rows of an open query. The query counts, keeps and scrolls; what is
 // here are the positions that the application sees: from 1, 0 before the first row, one behind the last at the end.
 //
-// Threads: under the statement's serial lock.
+// Threads: under the statement's serial lock. What reads the query is a long call.
 #pragma once
 
 #include <cstdint>
