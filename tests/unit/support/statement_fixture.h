@@ -15,23 +15,8 @@
 #include "kelpci.h"
 #include "oci.h"
 
-class StatementTest : public testing::Test {
-protected:
-    explicit StatementTest(ub4 mode = OCI_DEFAULT) : mode_(mode) {}
-
-    void SetUp() override {
-        ASSERT_EQ(OCIEnvCreate(&env, mode_, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
-        err = New<OCIError>(OCI_HTYPE_ERROR);
-        const std::string database = Encoded(":memory:");
-        ASSERT_EQ(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Bytes(database), Size(database)), OCI_SUCCESS);
-        stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-    }
-    void TearDown() override {
-        OCILogoff(svc, err);
-        EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-        EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
-    }
-
+// The calls, on handles that each thread may have of its own.
+struct StatementCalls {
     template <class T>
     T* New(ub4 type) const {
         dvoid* handle = nullptr;
@@ -57,6 +42,10 @@ protected:
     static const OraText* Bytes(std::string_view text) { return reinterpret_cast<const OraText*>(text.data()); }
     static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
 
+    sword Logon(OCISvcCtx** context) const {
+        const std::string database = Encoded(":memory:");
+        return OCILogon(env, err, context, nullptr, 0, nullptr, 0, Bytes(database), Size(database));
+    }
     sb4 Answer(sword rc) const {
         sb4 number = 0;
         if (rc == OCI_SUCCESS) return 0;
@@ -191,7 +180,27 @@ protected:
     OCIError* err = nullptr;
     OCISvcCtx* svc = nullptr;
     OCIStmt* stmt = nullptr;
+    ub4 mode_ = OCI_DEFAULT;
+};
 
-private:
-    ub4 mode_;
+class StatementTest : public testing::Test, protected StatementCalls {
+protected:
+    explicit StatementTest(ub4 mode = OCI_DEFAULT) { mode_ = mode; }
+
+    void SetUp() override {
+        ASSERT_EQ(OCIEnvCreate(&env, mode_, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+        err = New<OCIError>(OCI_HTYPE_ERROR);
+        ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
+        stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+    }
+    void TearDown() override {
+        OCILogoff(svc, err);
+        EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+        EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
+    }
+    using StatementCalls::Run;    // and not the base's
+    // Handles for another thread of the same session.
+    [[nodiscard]] StatementCalls Another() const {
+        return {env, New<OCIError>(OCI_HTYPE_ERROR), svc, New<OCIStmt>(OCI_HTYPE_STMT), mode_};
+    }
 };
