@@ -368,7 +368,8 @@ int SqliteConnection::OnBusy(void* self, int attempts) {
 
 void SqliteConnection::OnChange(void* self, int, const char*, const char* table, sqlite3_int64 row) {
     auto& connection = *static_cast<SqliteConnection*>(self);
-    if (connection.changed_table && *connection.changed_table == table) connection.changed_row = row;
+    if (connection.changed_table && std::strcmp(connection.changed_table->c_str(), table) == 0)
+        connection.changed_row = row;
 }
 
 // SQLite tells the table of the statement before those of its triggers and cascades.
