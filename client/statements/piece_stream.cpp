@@ -156,7 +156,8 @@ void PieceStream::Begin(ub4 row, std::span<const engine::Datum> values) {
 // The next define that takes its value in pieces, and that value; none is wanted at the end of the row.
 int PieceStream::NextValue(const Defines& defines) {
     const std::vector<Defines::Active>& all = defines.All();
-    while (define_ < all.size() && !all[define_].area->InPieces()) ++define_;
+    const auto takes_part = [](const DataArea& area) { return area.InPieces() && area.HasHandle(); };
+    while (define_ < all.size() && !takes_part(*all[define_].area)) ++define_;
     if (define_ == all.size()) return 0;
     const Defines::Active& active = all[define_++];
     DataArea& area = *active.area;

@@ -323,6 +323,16 @@ TEST_F(PieceByPiece, HandlesThatAreFreedMeanwhile) {
     Wanted wanted;
     EXPECT_EQ(Get(wanted), 24370);
     EXPECT_EQ(Fetch(), 24374);
+    ASSERT_EQ(Prepare("select 'abc', 'def' from dual"), 0);
+    OCIDefine* defines[2] = {};
+    for (ub4 column : {0, 1}) ASSERT_EQ(Define(&defines[column], column + 1, InPieces(SQLT_CHR)), 0);
+    ASSERT_EQ(Execute(0), 0);
+    ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
+    ASSERT_EQ(OCIHandleFree(defines[1], OCI_HTYPE_DEFINE), OCI_SUCCESS);
+    char first[3];
+    ub4 length = sizeof first;
+    ASSERT_EQ(Answer(OCIStmtSetPieceInfo(defines[0], OCI_HTYPE_DEFINE, err, first, &length, OCI_ONE_PIECE, nullptr, nullptr)), 0);
+    EXPECT_EQ(Fetch(), 0) << "nobody is asked for what nobody can be given";
     ASSERT_EQ(Prepare("select :1 from dual"), 0);
     OCIBind* bind = nullptr;
     ASSERT_EQ(Bind(&bind, 1, InPieces(SQLT_CHR)), 0);
