@@ -341,6 +341,33 @@ TEST_F(PieceByPiece, HandlesThatAreFreedMeanwhile) {
     EXPECT_EQ(Execute(0), 1008);
 }
 
+// The pieces of one value go out while the define of the next, which the application allocated, is freed: its turn never
+// comes, and the fetch begins anew with what is left.
+TEST_F(PieceByPiece, ADefineFreedBeforeItsTurn) {
+    ASSERT_EQ(Prepare("select 'abc', 'def' from dual union all select 'ghi', 'jkl' from dual"), 0);
+    OCIDefine* first = nullptr;
+    OCIDefine* second = New<OCIDefine>(OCI_HTYPE_DEFINE);
+    ASSERT_EQ(Define(&first, 1, InPieces(SQLT_CHR)), 0);
+    ASSERT_EQ(Define(&second, 2, InPieces(SQLT_CHR)), 0);
+    ASSERT_EQ(Execute(0), 0);
+    ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
+    sword rc = 0;
+    EXPECT_EQ(Piece(2, rc), "ab");
+    EXPECT_EQ(Piece(2, rc), "c");
+    EXPECT_EQ(rc, OCI_NEED_DATA);
+    EXPECT_EQ(Piece(2, rc), "de");    // through a handle that no statement made
+    EXPECT_EQ(Piece(2, rc), "f");
+    EXPECT_EQ(rc, OCI_SUCCESS);
+    ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
+    EXPECT_EQ(Piece(2, rc), "gh");
+    ASSERT_EQ(OCIHandleFree(second, OCI_HTYPE_DEFINE), OCI_SUCCESS);
+    EXPECT_EQ(Piece(2, rc), "i");
+    EXPECT_EQ(rc, OCI_NEED_DATA);
+    Wanted wanted;
+    EXPECT_EQ(Get(wanted), 24370);
+    EXPECT_EQ(FetchCode(), OCI_NO_DATA);
+}
+
 class Utf16Pieces : public PieceByPiece {
 protected:
     Utf16Pieces() : PieceByPiece(OCI_UTF16) {}
