@@ -1,42 +1,9 @@
 // What SQL text means on the embedded engine, as an application sees it: values compared and stored where SQLite alone
 // would take texts as they stand, what expressions are described as, what definitions say, what is refused.
-#include <sqlite3.h>
-
-#include <cstdlib>
-#include <new>
 #include <ostream>
 #include <tuple>
 
 #include "support/statement_fixture.h"
-
-namespace {
-
-// How many more allocations succeed, before those of SQLite fail, too; -1: all.
-long allocations_allowed = -1;
-
-void AllowAllocations(long count) {
-    allocations_allowed = count;
-    sqlite3_hard_heap_limit64(0);
-}
-
-void* Allocate(std::size_t size) {
-    if (allocations_allowed == 0) {
-        sqlite3_hard_heap_limit64(1);
-        return nullptr;
-    }
-    if (allocations_allowed > 0) --allocations_allowed;
-    return std::malloc(size > 0 ? size : 1);
-}
-
-}  // namespace
-
-void* operator new(std::size_t size) {
-    void* block = Allocate(size);
-    return block ? block : throw std::bad_alloc();
-}
-void* operator new(std::size_t size, const std::nothrow_t&) noexcept { return Allocate(size); }
-void operator delete(void* block) noexcept { std::free(block); }
-void operator delete(void* block, std::size_t) noexcept { std::free(block); }
 
 namespace {
 
@@ -506,28 +473,6 @@ TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
     MustRun("insert into t select '   ' from dual");
     EXPECT_EQ(Rows("select '[' || c || ']' as x, length(c) as n from t where c is not null"), "[ ],1;");
     EXPECT_EQ(Rows("select c from t"), "   ;");
-}
-
-// Memory that stays short from some allocation on, in the middle of the library's SQL functions.
-TEST_F(SqliteMeaning, FunctionWithoutMemoryLeavesTheSessionInOrder) {
-    MustRun("create table t(id number, d date)");
-    MustRun("insert into t values(1, '03-FEB-24')");
-    for (const char* sql : {"select id from t where d > :x || '-24'", "select to_char(d, 'YYYY') || :x as y from t",
-                            "select cast(id || :x as varchar2(9)) as v from t"}) {
-        sb4 answer = 0;
-        for (long allowed = 0; allowed < 200; ++allowed) {
-            ASSERT_EQ(PrepareBound(sql, "01-JAN"), 0);
-            AllowAllocations(allowed);
-            answer = Execute(0);
-            AllowAllocations(-1);
-            sqlite3_hard_heap_limit64(1);
-            EXPECT_EQ(Rows("select 2 as n from dual"), "!1019");
-            sqlite3_hard_heap_limit64(0);
-            EXPECT_EQ(Rows("select 1 as n from dual"), "1;") << sql << " after " << allowed << " allocations";
-            if (answer == 0) break;
-        }
-        EXPECT_EQ(answer, 0) << sql;
-    }
 }
 
 }  // namespace

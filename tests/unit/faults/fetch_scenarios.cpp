@@ -72,14 +72,14 @@ void FetchArrays(World& w) {
 
 // The rows are read to the end before the other statement writes, and each takes memory of SQLite's: what fails there
 // may lose the transaction, and the change must not go on outside of it.
-void FetchAheadOfAWriter(World& w) {
+void FetchAhead(World& w, ub4 mode) {
     EXPECT_EQ(w.One("select count(*) from other"), "0") << "what was rolled back";
     w.Sql("insert into other values(0)");
     w.Keeps("select count(*) from other", "1");
     Rows rows;
     w.Prepare("select a, printf('%.*c', a * 6, 'x') from t");
     rows.Define(w);
-    w.Execute(0);
+    w.Execute(0, mode);
     w.Fetch(6);
     rows.Show(w, RowsFetched(w));
     OCIStmt* const query = w.stmt;
@@ -98,6 +98,9 @@ void FetchAheadOfAWriter(World& w) {
     w.stmt = query;
     ShowAll(w, rows);
 }
+
+void FetchAheadOfAWriter(World& w) { FetchAhead(w, OCI_DEFAULT); }
+void ScrollAheadOfAWriter(World& w) { FetchAhead(w, OCI_STMT_SCROLLABLE_READONLY); }
 
 void Scroll(World& w) {
     Rows rows;
@@ -213,6 +216,20 @@ void SortsAndGroups(World& w) {
     while (w.Fetch() == OCI_SUCCESS) w.See(number);
 }
 
+// The library's SQL functions and comparisons on values that are bound.
+void FunctionsOfBinds(World& w) {
+    char value[] = "01-JAN", text[40] = "";
+    for (const char* sql : {"select a from t where to_date('03-FEB-24') > :x || '-24' and a = 7",
+                            "select to_char(to_date('03-FEB-24'), 'YYYY') || :x as y from t where a = 7",
+                            "select cast(a || :x as varchar2(9)) as v from t where nvl(a, 1) = 7"}) {
+        w.Prepare(sql);
+        w.Bind(1, {value, sizeof value, SQLT_STR});
+        w.Define(1, {text, sizeof text, SQLT_STR});
+        w.Execute(1);
+        w.See(text);
+    }
+}
+
 // Texts of the application's in UTF-16 on every way.
 void InUtf16(World& w) {
     const std::u16string_view sql = u"select 'a value of some length: ' || :x from dual";
@@ -255,12 +272,14 @@ void LongRowsReadAhead(World& w) {
 constexpr Scenario kScenarios[] = {
     {"FetchArrays", Ground::session, TableOfRows, FetchArrays, kTwenty},
     {"FetchAheadOfAWriter", Ground::session, TableOfRows, FetchAheadOfAWriter, kTwenty},
+    {"ScrollAheadOfAWriter", Ground::session, TableOfRows, ScrollAheadOfAWriter, kTwenty},
     {"Scroll", Ground::session, TableOfRows, Scroll, "1,2,;20,;12,13,14,;1,2,;5,;4,;"},
     {"ExactFetch", Ground::session, TableOfRows, ExactFetch, "18,19,20,"},
     {"PiecesOut", Ground::session, TableOfRows, PiecesOut, "xxxxxx1;xxxxxxxxxxxx2;xxxxxxxxxxxxxxxxxx3;100;"},
     {"ManyTypes", Ground::session, TableOfRows, ManyTypes,
      "1235;2055;155;a text that is not short at all;225;18;1000000000000000000000000000000;"},
     {"SortsAndGroups", Ground::session, TableOfRows, SortsAndGroups, "50;42;39;36;33;4;"},
+    {"FunctionsOfBinds", Ground::session, TableOfRows, FunctionsOfBinds, "7;202401-JAN;701-JAN;"},
     {"InUtf16", Ground::session, nullptr, InUtf16, "108;right;", OCI_UTF16},
     {"LongRowsReadAhead", Ground::session, TableOfRows, LongRowsReadAhead, "210;"},
 };

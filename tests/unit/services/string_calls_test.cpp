@@ -1,5 +1,4 @@
 // The calls on strings and raws.
-#include <cstdlib>
 #include <vector>
 
 #include "support/call_fixture.h"
@@ -103,31 +102,6 @@ TEST_F(StringCalls, HugeLengths) {
         EXPECT_EQ(Answer(OCIStringResize(env_, err_, length, &string)), 22140) << length;
         EXPECT_EQ(string, nullptr);
     }
-}
-
-// Memory that runs out at the first, the second, the third call.
-TEST(StringMemory, AllocationsThatFail) {
-    static int left;
-    const auto allocate = [](dvoid*, size_t size) -> dvoid* { return left-- > 0 ? std::malloc(size) : nullptr; };
-    const auto reallocate = [](dvoid*, dvoid* memory, size_t size) -> dvoid* { return std::realloc(memory, size); };
-    const auto release = [](dvoid*, dvoid* memory) { std::free(memory); };
-    left = 100;
-    OCIEnv* env = nullptr;
-    ASSERT_EQ(OCIEnvCreate(&env, OCI_DEFAULT, nullptr, allocate, reallocate, release, 0, nullptr), OCI_SUCCESS);
-    dvoid* err = nullptr;
-    ASSERT_EQ(OCIHandleAlloc(env, &err, OCI_HTYPE_ERROR, 0, nullptr), OCI_SUCCESS);
-    int failures = 0;
-    for (int allowed = 0; allowed < 4; ++allowed) {
-        OCIString* string = nullptr;
-        left = allowed;
-        const sword code = OCIStringAssignText(env, static_cast<OCIError*>(err),
-                                               reinterpret_cast<const OraText*>("text"), 4, &string);
-        EXPECT_EQ(string != nullptr, code == OCI_SUCCESS) << allowed;
-        failures += code == OCI_ERROR;
-    }
-    EXPECT_EQ(failures, 2);    // the object, its block
-    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-    EXPECT_EQ(OCI_memGetMemCount(), 0);
 }
 
 }  // namespace
