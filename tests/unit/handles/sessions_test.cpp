@@ -1,28 +1,18 @@
 // Sessions: what their end does to the work done in them, what attributes tell of them, and several threads that begin,
 // use, break and end the same ones.
-#include <gtest/gtest.h>
-
 #include <atomic>
 #include <barrier>
 #include <chrono>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
 #include <functional>
 #include <future>
-#include <string>
 #include <thread>
 #include <vector>
 
-#include "kelpci.h"
-#include "oci.h"
+#include "support/call_fixture.h"
 
 namespace {
 
 using namespace std::chrono_literals;
-
-const OraText* Text(const char* text) { return reinterpret_cast<const OraText*>(text); }
-ub4 Length(const char* text) { return text ? static_cast<ub4>(std::strlen(text)) : 0; }
 
 // Two threads that wait for each other without sleeping, so that they go on in the same moment.
 class Turn {
@@ -37,34 +27,18 @@ private:
     std::atomic<int> came_{0};
 };
 
-class Sessions : public testing::Test {
+class Sessions : public CallFixture {
 protected:
+    Sessions() : CallFixture(OCI_THREADED) {}
     void SetUp() override {
-        char name[] = "/tmp/kelp-sessions-XXXXXX";
-        folder_ = mkdtemp(name);
-        setenv("KELPCI_HOME", folder_.c_str(), 1);
-        ASSERT_EQ(OCIEnvCreate(&env_, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
-        err_ = New<OCIError>(OCI_HTYPE_ERROR);
-    }
-    void TearDown() override {
-        EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
-        EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
-        std::filesystem::remove_all(folder_);
+        CallFixture::SetUp();
+        Folder();
     }
 
-    template <class T>
-    T* New(ub4 type) const {
-        dvoid* handle = nullptr;
-        EXPECT_EQ(OCIHandleAlloc(env_, &handle, type, 0, nullptr), OCI_SUCCESS) << type;
-        return static_cast<T*>(handle);
+    using CallFixture::LogOn;
+    sb4 LogOn(OCISvcCtx** svc, const char* database, OCIError* err) const {
+        return Answer(OCILogon(env_, err, svc, nullptr, 0, nullptr, 0, Text(database), Length(database)), err);
     }
-    // 0, or the number of the error; the return code itself when there is no record.
-    static sb4 Answer(sword rc, OCIError* err) {
-        sb4 number = 0;
-        if (rc == OCI_SUCCESS) return 0;
-        return OCIErrorGet(err, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR) == OCI_SUCCESS ? number : rc;
-    }
-    sb4 Answer(sword rc) const { return Answer(rc, err_); }
     sb4 Run(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, const char* sql, ub4 iterations) const {
         const sb4 prepared =
             Answer(OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), err);
@@ -89,10 +63,6 @@ protected:
         OCIHandleFree(stmt, OCI_HTYPE_STMT);
         return answer == 0 ? count : -answer;
     }
-    sb4 LogOn(OCISvcCtx** svc, const char* database, OCIError* err) const {
-        return Answer(OCILogon(env_, err, svc, nullptr, 0, nullptr, 0, Text(database), Length(database)), err);
-    }
-    sb4 LogOn(OCISvcCtx** svc, const char* database) const { return LogOn(svc, database, err_); }
     OCIServer* NewServer(const char* database) const {
         auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
         EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(database), static_cast<sb4>(Length(database)), 0)), 0);
@@ -103,12 +73,6 @@ protected:
         EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
         EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION, err_)), 0);
         return svc;
-    }
-    template <class T>
-    T Attribute(const dvoid* handle, ub4 type, ub4 attribute) const {
-        T value{};
-        EXPECT_EQ(Answer(OCIAttrGet(handle, type, &value, nullptr, attribute, err_)), 0) << attribute;
-        return value;
     }
     // work(index, error handle) in threads of their own, let go together. Ends the process when they hang.
     void AtOnce(int count, const std::function<void(int, OCIError*)>& work) const {
@@ -128,10 +92,6 @@ protected:
             std::abort();
         }
     }
-
-    std::string folder_;
-    OCIEnv* env_ = nullptr;
-    OCIError* err_ = nullptr;
 };
 
 TEST_F(Sessions, TheEndCommitsAndADetachRollsBack) {
@@ -163,26 +123,78 @@ TEST_F(Sessions, TheEndCommitsAndADetachRollsBack) {
     EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "and so does freeing the context";
 }
 
+// What fails outside of a transaction leaves none behind: nobody has to wait for it.
+TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
+    OCISvcCtx *first = nullptr, *second = nullptr;
+    ASSERT_EQ(LogOn(&first, "work"), 0);
+    ASSERT_EQ(Run(first, "create table t(a number unique)"), 0);
+    ASSERT_EQ(LogOn(&second, "work"), 0);
+    const struct { const char* sql; sb4 answer; } cases[] = {
+        {"rollback to nowhere", 1086}, {"release nowhere", 1086}, {"insert into t values('x')", 1722},
+        {"begin insert into t values(1); insert into t values(1); end;", 1}, {"begin rollback to nowhere; end;", 1086}};
+    for (const auto& c : cases) {
+        EXPECT_EQ(Run(first, c.sql), c.answer) << c.sql;
+        EXPECT_EQ(Run(second, "insert into t values(9)"), 0) << c.sql;
+        EXPECT_EQ(Run(second, "rollback"), 0);
+    }
+}
+
 // The database of a server in memory lives as long as the server is attached.
 TEST_F(Sessions, AServerInMemoryKeepsItsDatabaseBetweenSessions) {
     OCIServer* server = NewServer(":memory:");
     auto* session = New<OCISession>(OCI_HTYPE_SESSION);
     OCISvcCtx* svc = NewContext(server, session);
-    const auto begin = [&](const char* password) {
+    const auto begin = [&](std::string password) {
         EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char*>("ann"), 3, OCI_ATTR_USERNAME, err_)),
                   0);
-        EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char*>(password), Length(password),
-                                    OCI_ATTR_PASSWORD, err_)), 0);
+        EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, password.data(),
+                                    static_cast<ub4>(password.size()), OCI_ATTR_PASSWORD, err_)), 0);
         return Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0));
     };
     ASSERT_EQ(begin("secret"), 0);
     ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
     ASSERT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 0);
     EXPECT_EQ(begin("wrong"), 1017);
+    EXPECT_EQ(begin({"secret\0x", 8}), 1017);
     EXPECT_EQ(Run(svc, "select n from t"), 1012);
     ASSERT_EQ(begin("secret"), 0);
     EXPECT_EQ(Count(svc, "select count(*) from t"), 0) << "the table is still there";
     ASSERT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 0);
+}
+
+TEST_F(Sessions, PasswordIsChangedForGoodOrNotAtAll) {
+    OCISvcCtx* svc = nullptr;
+    const auto change = [&] {
+        return Answer(OCIPasswordChange(svc, err_, Text("ann"), 3, Text("secret"), 6, Text("new"), 3, OCI_DEFAULT));
+    };
+    ASSERT_EQ(LogOn(&svc, "x", "ann", "secret"), 0);
+    ASSERT_EQ(Run(svc, "create table t(n integer)"), 0);
+    ASSERT_EQ(Run(svc, "insert into t values(1)"), 0);
+    EXPECT_EQ(change(), 24754);
+    EXPECT_EQ(Run(svc, "update kelp_accounts set password = ''"), 1031);
+    ASSERT_EQ(Run(svc, "rollback"), 0);
+    EXPECT_EQ(change(), 0);
+    ASSERT_EQ(Run(svc, "rollback"), 0);
+    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    EXPECT_EQ(LogOn(&svc, "x", "ann", "secret"), 1017);
+    EXPECT_EQ(LogOn(&svc, "x", "ann", "new"), 0);
+}
+
+TEST_F(Sessions, BreakMeetsOneCall) {
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
+    ASSERT_EQ(Run(svc, "create table t(n integer)"), 0);
+    const auto interrupt = [&] { EXPECT_EQ(Answer(OCIBreak(svc, err_)), 0); };
+    interrupt();
+    EXPECT_EQ(Count(svc, "select 1 from dual"), -1013);
+    EXPECT_EQ(Count(svc, "select 1 from dual"), 1);
+    interrupt();
+    EXPECT_EQ(Answer(OCIReset(svc, err_)), 0);
+    EXPECT_EQ(Run(svc, "insert into t values(1)"), 0);
+    interrupt();
+    EXPECT_EQ(Run(svc, "commit"), 0) << "what ends a transaction is not stopped";
+    EXPECT_EQ(Run(svc, "insert into t values(2)"), 1013);
+    EXPECT_EQ(Count(svc, "select count(*) from t"), 1);
 }
 
 TEST_F(Sessions, AttributesFollowWhatHappens) {

@@ -5,7 +5,6 @@
 
 #include <atomic>
 #include <chrono>
-#include <filesystem>
 #include <fstream>
 #include <functional>
 #include <thread>
@@ -19,14 +18,12 @@ class FileCalls : public CallFixture {
 protected:
     void SetUp() override {
         CallFixture::SetUp();
-        char name[] = "/tmp/kelp-files-XXXXXX";
-        folder_ = mkdtemp(name);
+        folder_ = Folder();
         ASSERT_EQ(OCIFileInit(env_, err_), OCI_SUCCESS);
     }
     void TearDown() override {
         EXPECT_EQ(OCIFileTerm(env_, err_), OCI_SUCCESS);
         CallFixture::TearDown();
-        std::filesystem::remove_all(folder_);
     }
 
     sb4 Open(const char* name, ub4 mode, ub4 create, OCIFileObject** file, ub4 type = OCI_FILE_BIN) {

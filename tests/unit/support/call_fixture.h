@@ -3,6 +3,9 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
 #include <string>
 #include <string_view>
 
@@ -11,19 +14,52 @@
 
 constexpr ub4 kHuge = 0xFFFFFFFF;    // a length that nobody means
 
+inline OCIEnv* NewEnvironment(ub4 mode = OCI_DEFAULT) {
+    OCIEnv* env = nullptr;
+    EXPECT_EQ(OCIEnvCreate(&env, mode, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+    return env;
+}
+template <class T>
+T* NewHandle(OCIEnv* env, ub4 type) {
+    dvoid* handle = nullptr;
+    EXPECT_EQ(OCIHandleAlloc(env, &handle, type, 0, nullptr), OCI_SUCCESS) << type;
+    return static_cast<T*>(handle);
+}
+// The number of a handle's first record, 0 without one.
+inline sb4 FirstCode(dvoid* handle, ub4 type = OCI_HTYPE_ERROR) {
+    sb4 code = 0;
+    return OCIErrorGet(handle, 1, nullptr, &code, nullptr, 0, type) == OCI_SUCCESS ? code : 0;
+}
+inline OraText* Text(const char* text) { return reinterpret_cast<OraText*>(const_cast<char*>(text)); }
+inline OraText* Text(std::string_view text) { return Text(text.data()); }
+inline OraText* Text(std::u16string_view text) {
+    return reinterpret_cast<OraText*>(const_cast<char16_t*>(text.data()));
+}
+inline ub4 Length(const char* text) { return text ? static_cast<ub4>(std::strlen(text)) : 0; }
+
 class CallFixture : public testing::Test {
 protected:
-    void SetUp() override { Open(OCI_DEFAULT); }
+    explicit CallFixture(ub4 mode = OCI_DEFAULT) : mode_(mode) {}
+
+    void SetUp() override { Open(mode_); }
     void TearDown() override {
         Close();
         EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
+        if (!folder_.empty()) std::filesystem::remove_all(folder_);
+    }
+    // A folder of the test's own, where databases lie that are named without one.
+    const std::string& Folder() {
+        if (folder_.empty()) {
+            char name[] = "/tmp/kelp-calls-XXXXXX";
+            folder_ = mkdtemp(name);
+            setenv("KELPCI_HOME", name, 1);
+        }
+        return folder_;
     }
 
     void Open(ub4 mode) {
-        ASSERT_EQ(OCIEnvCreate(&env_, mode, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
-        dvoid* handle = nullptr;
-        ASSERT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_ERROR, 0, nullptr), OCI_SUCCESS);
-        err_ = static_cast<OCIError*>(handle);
+        env_ = NewEnvironment(mode);
+        err_ = New<OCIError>(OCI_HTYPE_ERROR);
     }
     void Close() {
         EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
@@ -34,11 +70,27 @@ protected:
         Open(mode);
     }
 
+    template <class T>
+    T* New(ub4 type) const {
+        return NewHandle<T>(env_, type);
+    }
     // The record's number after OCI_ERROR; else the return code.
-    [[nodiscard]] sb4 Answer(sword code) const {
-        sb4 number = 0;
-        if (code != OCI_ERROR) return code;
-        return OCIErrorGet(err_, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR) == OCI_SUCCESS ? number : code;
+    static sb4 Answer(sword code, OCIError* err) {
+        const sb4 number = code == OCI_ERROR ? FirstCode(err) : 0;
+        return number != 0 ? number : code;
+    }
+    [[nodiscard]] sb4 Answer(sword code) const { return Answer(code, err_); }
+
+    // Without a user by the means of the system.
+    sb4 LogOn(OCISvcCtx** svc, const char* database, const char* user = nullptr, const char* password = nullptr) const {
+        return Answer(OCILogon(env_, err_, svc, Text(user), Length(user), Text(password), Length(password),
+                               Text(database), Length(database)));
+    }
+    template <class T>
+    T Attribute(const dvoid* handle, ub4 type, ub4 attribute) const {
+        T value{};
+        EXPECT_EQ(Answer(OCIAttrGet(handle, type, &value, nullptr, attribute, err_)), 0) << attribute;
+        return value;
     }
 
     [[nodiscard]] std::string Message() const {
@@ -54,16 +106,11 @@ protected:
         return reinterpret_cast<T*>(bogus_);
     }
 
-    static OraText* Text(std::string_view text) {
-        return reinterpret_cast<OraText*>(const_cast<char*>(text.data()));
-    }
-    static OraText* Text(std::u16string_view text) {
-        return reinterpret_cast<OraText*>(const_cast<char16_t*>(text.data()));
-    }
-
     OCIEnv* env_ = nullptr;
     OCIError* err_ = nullptr;
 
 private:
+    ub4 mode_;
+    std::string folder_;
     alignas(16) char bogus_[16] = "no such object!";
 };
