@@ -302,7 +302,8 @@ TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
 TEST_F(PieceByPiece, ARowThatFails) {
     MustRun("create table t(a varchar2(10) primary key)");
     ASSERT_EQ(Ready("insert into t values(:1)", {InPieces(SQLT_CHR)}), 0);
-    for (ub4 row = 0, length = 1; row < 2; ++row) {
+    ub4 length = 1;    // read by the execute that follows
+    for (int row = 0; row < 2; ++row) {
         ASSERT_EQ(ExecuteCode(3), OCI_NEED_DATA);
         ASSERT_EQ(Set("x", &length, OCI_ONE_PIECE), 0);
     }
