@@ -156,7 +156,9 @@ void PieceStream::Begin(ub4 row, std::span<const engine::Datum> values) {
 // The next define that takes its value in pieces, and that value; none is wanted at the end of the row.
 int PieceStream::NextValue(const Defines& defines) {
     const std::vector<Defines::Active>& all = defines.All();
-    const auto takes_part = [](const DataArea& area) { return area.InPieces() && area.HasHandle(); };
+    const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
+    const bool all_live = erased == defines.Seen();
+    const auto takes_part = [&](const DataArea& area) { return area.InPieces() && (all_live || area.HasHandle()); };
     while (define_ < all.size() && !takes_part(*all[define_].area)) ++define_;
     if (define_ == all.size()) return 0;
     const Defines::Active& active = all[define_++];
@@ -173,7 +175,7 @@ int PieceStream::NextValue(const Defines& defines) {
     area.piece.is_set = false;
     wanted_.area = &area;
     wanted_.continued = wanted_.asked = false;
-    seen_ = defines.Seen();
+    seen_ = erased;
     return 0;
 }
 
