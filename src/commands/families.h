@@ -20,6 +20,7 @@ void AddHandleCommands(HandlerTable& handlers);
 void AddLobCommands(HandlerTable& handlers);
 void AddLobTransferCommands(HandlerTable& handlers);
 void AddNumberCommands(HandlerTable& handlers);
+void AddPoolCommands(HandlerTable& handlers);
 void AddRowidCommands(HandlerTable& handlers);
 void AddSessionCommands(HandlerTable& handlers);
 void AddStatementCommands(HandlerTable& handlers);
@@ -46,6 +47,7 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddLobCommands,
     AddLobTransferCommands,
     AddNumberCommands,
+    AddPoolCommands,
     AddRowidCommands,
     AddSessionCommands,
     AddStatementCommands,

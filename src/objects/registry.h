@@ -9,6 +9,7 @@
 #include <cstring>
 #include <optional>
 #include <span>
+#include <string>
 
 enum class Kind : uint8_t {
     environment, error, svc, server, session, trans, spool, cpool, stmt, describe, bind, define, param,
@@ -34,8 +35,7 @@ struct NamedObject {
     char name[36] = {};
 };
 struct NamedPool : NamedObject {
-    char* pool_name = nullptr;  // filled by the library
-    uint32_t pool_name_length = 0;
+    std::string pool_name;  // what the library calls the pool, in its own characters; empty until it is created
 };
 struct NamedStatement : NamedObject {
     uint32_t utf16_mode = 0;  // 0x4000 when the statement's character data is UTF-16

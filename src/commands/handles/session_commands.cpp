@@ -6,6 +6,7 @@
 
 #include "commands/families.h"
 #include "commands/shared/handle_call.h"
+#include "commands/shared/pool_name.h"
 #include "core/messages.h"
 #include "core/state.h"
 #include "objects/text_conversion.h"
@@ -59,7 +60,7 @@ struct LogonTexts {
 };
 
 struct Logon : CommandRow {
-    sword (*call)(OCIEnv* environment, OCIError* error, OCISvcCtx** place, const LogonTexts& texts, char** words);
+    sword (*call)(OCIEnv* environment, OCIError* error, OCISvcCtx** place, LogonTexts& texts, char** words);
 };
 
 // A name in use hands over its service context and stays as it is.
@@ -79,16 +80,17 @@ void RunLogon(const Logon& row, int, char** words) {
 constexpr Logon kLogons[] = {
     {{Code::ocilogon, Words(10),
       "OCILogon hEnv hError hSvc username username_len password password_len server server_len"},
-     [](OCIEnv* environment, OCIError* error, OCISvcCtx** place, const LogonTexts& texts, char**) {
+     [](OCIEnv* environment, OCIError* error, OCISvcCtx** place, LogonTexts& texts, char**) {
          return Call(&ClientLibrary::OCILogon, environment, error, place, texts.user.Text(), texts.user.Length(),
                      texts.password.Text(), texts.password.Length(), texts.server.Text(), texts.server.Length());
      }},
     {{Code::ocilogon2, Words(11),
       "OCILogon2 hEnv hError hSvc username username_len password password_len server server_len mode"},
-     [](OCIEnv* environment, OCIError* error, OCISvcCtx** place, const LogonTexts& texts, char** words) {
+     [](OCIEnv* environment, OCIError* error, OCISvcCtx** place, LogonTexts& texts, char** words) {
+         const ub4 mode = DecodeMode(words[10], Logon2ModeKeywords);
+         UsePoolName(texts.server, words[8], mode, kLogonPoolModes);
          return Call(&ClientLibrary::OCILogon2, environment, error, place, texts.user.Text(), texts.user.Length(),
-                     texts.password.Text(), texts.password.Length(), texts.server.Text(), texts.server.Length(),
-                     DecodeMode(words[10], Logon2ModeKeywords));
+                     texts.password.Text(), texts.password.Length(), texts.server.Text(), texts.server.Length(), mode);
      }},
 };
 
@@ -99,8 +101,10 @@ void AttachServer(const CommandRow& row, int, char** words) {
     auto* const error = ResolveError<OCIError>(words[2]);
     TextArgument name;
     if (!name.SetWords(words + 3)) return;
+    const ub4 mode = DecodeMode(words[5], ServerAttachKeywords);
+    UsePoolName(name, words[3], mode, kAttachPoolModes);
     const sword rc = Call(&ClientLibrary::OCIServerAttach, server, error, name.Text(), static_cast<sb4>(name.Length()),
-                          DecodeMode(words[5], ServerAttachKeywords));
+                          mode);
     TraceAndReport(row.code, words[1], error, rc);
 }
 
