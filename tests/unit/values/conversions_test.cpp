@@ -30,9 +30,8 @@ protected:
         ub2 code = 0;
         length_ = 0;
         indicator_ = 9;
-        sb4 answer = Prepare("select " + expression + " from dual");
-        if (answer == 0) answer = Define(1, {area.data(), size, type, &indicator_, &length_, &code});
-        if (answer == 0) answer = Execute(1);
+        const sb4 answer = Query("select " + expression + " from dual",
+                                 {{area.data(), size, type, &indicator_, &length_, &code}});
         return answer == 0 || answer == 24345 ? area : "!" + std::to_string(answer);
     }
     // What the database sees of an element.
@@ -41,9 +40,9 @@ protected:
         std::string copy = area;
         char text[200] = "";
         sb2 indicator = 0;
-        sb4 answer = Prepare("select " + seen_through + " from dual");
-        if (answer == 0) answer = Bind(1, {copy.data(), static_cast<sb4>(copy.size()), type, nullptr, length});
-        if (answer == 0) answer = Define(1, {text, sizeof text, SQLT_STR, &indicator});
+        sb4 answer = Ready("select " + seen_through + " from dual",
+                           {{copy.data(), static_cast<sb4>(copy.size()), type, nullptr, length}});
+        if (answer == 0) answer = Define(1, Text(text, &indicator));
         if (answer == 0) answer = Execute(1);
         if (answer != 0) return "!" + std::to_string(answer);
         return indicator == -1 ? "-" : text;
@@ -59,40 +58,26 @@ protected:
 
 TEST_F(Conversions, TextAndBytesInEachLayout) {
     const struct { const char* expression; ub2 type; sb4 size; const char* hex; ub2 length; sb2 indicator; } cases[] = {
-        {"'abc'", SQLT_CHR, 5, "6162632323", 3, 0},
-        {"'abc'", SQLT_CHR, 2, "6162", 2, 3},
-        {"'abc'", SQLT_LNG, 3, "616263", 3, 0},
-        {"'abc'", SQLT_STR, 5, "6162630023", 3, 0},
-        {"'abc'", SQLT_STR, 4, "61626300", 3, 0},
-        {"'abc'", SQLT_STR, 3, "616200", 2, 3},
-        {"'abc'", SQLT_STR, 1, "00", 0, 3},
-        {"'abc'", SQLT_AFC, 5, "6162632020", 5, 0},
-        {"'abc'", SQLT_AFC, 2, "6162", 2, 3},
-        {"'abc'", SQLT_VCS, 6, "030061626323", 5, 0},
-        {"'abc'", SQLT_VCS, 4, "02006162", 4, 3},
-        {"'abc'", SQLT_AVC, 5, "0300616263", 5, 0},
+        {"'abc'", SQLT_CHR, 5, "6162632323", 3, 0}, {"'abc'", SQLT_CHR, 2, "6162", 2, 3},
+        {"'abc'", SQLT_LNG, 3, "616263", 3, 0}, {"'abc'", SQLT_STR, 5, "6162630023", 3, 0},
+        {"'abc'", SQLT_STR, 4, "61626300", 3, 0}, {"'abc'", SQLT_STR, 3, "616200", 2, 3},
+        {"'abc'", SQLT_STR, 1, "00", 0, 3}, {"'abc'", SQLT_AFC, 5, "6162632020", 5, 0},
+        {"'abc'", SQLT_AFC, 2, "6162", 2, 3}, {"'abc'", SQLT_VCS, 6, "030061626323", 5, 0},
+        {"'abc'", SQLT_VCS, 4, "02006162", 4, 3}, {"'abc'", SQLT_AVC, 5, "0300616263", 5, 0},
         {"'abc'", SQLT_LVC, 8, "0300000061626323", 7, 0},
         {"'a\xc3\xa4'", SQLT_CHR, 2, "6123", 1, 3},    // never half a character
-        {"x'0AFF'", SQLT_CHR, 4, "30414646", 4, 0},
-        {"x'0AFF'", SQLT_BIN, 3, "0AFF23", 2, 0},
-        {"x'0AFF'", SQLT_LBI, 1, "0A", 1, 2},
-        {"x'0AFF'", SQLT_VBI, 4, "02000AFF", 4, 0},
-        {"x'0AFF01'", SQLT_VBI, 4, "02000AFF", 4, 3},
-        {"'0aF'", SQLT_BIN, 4, "00AF2323", 2, 0},
-        {"'0ag'", SQLT_BIN, 4, nullptr, 1465, 0},
-        {"12", SQLT_BIN, 4, nullptr, 932, 0},
+        {"x'0AFF'", SQLT_CHR, 4, "30414646", 4, 0}, {"x'0AFF'", SQLT_BIN, 3, "0AFF23", 2, 0},
+        {"x'0AFF'", SQLT_LBI, 1, "0A", 1, 2}, {"x'0AFF'", SQLT_VBI, 4, "02000AFF", 4, 0},
+        {"x'0AFF01'", SQLT_VBI, 4, "02000AFF", 4, 3}, {"'0aF'", SQLT_BIN, 4, "00AF2323", 2, 0},
+       
     };
     for (const auto& c : cases) {
-        const std::string shown = Shown(c.expression, c.type, c.size);
-        const std::string area = Out(c.expression, c.type, c.size);
-        if (!c.hex) {
-            EXPECT_EQ(area, "!" + std::to_string(c.length)) << shown;
-            continue;
-        }
-        EXPECT_EQ(Hex(area), c.hex) << shown;
-        EXPECT_EQ(length_, c.length) << shown;
-        EXPECT_EQ(indicator_, c.indicator) << shown;
+        EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << Shown(c.expression, c.type, c.size);
+        EXPECT_EQ(length_, c.length) << Shown(c.expression, c.type, c.size);
+        EXPECT_EQ(indicator_, c.indicator) << Shown(c.expression, c.type, c.size);
     }
+    EXPECT_EQ(Out("'0ag'", SQLT_BIN, 4), "!1465");
+    EXPECT_EQ(Out("12", SQLT_BIN, 4), "!932");
 }
 
 TEST_F(Conversions, NumbersAsText) {
@@ -123,8 +108,7 @@ TEST_F(Conversions, Integers) {
         {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722},
         {"x'01'", SQLT_INT, 4, 0, 932},
         {"255", SQLT_UIN, 1, 255, 0}, {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455},
-        {"-0.5", SQLT_UIN, 4, 0, 0},
-        {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
+        {"-0.5", SQLT_UIN, 4, 0, 0}, {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
         {"cast('18446744073709551615' as number)", SQLT_UIN, 8, -1, 0},
         {"cast('18446744073709551616' as number)", SQLT_UIN, 8, 0, 1455}, {"date '2024-01-01'", SQLT_INT, 4, 0, 1722},
     };
@@ -172,9 +156,8 @@ TEST_F(Conversions, OtherNumbers) {
 }
 
 TEST_F(Conversions, BinaryColumnsKeepTheirReals) {
-    MustRun("create table r(f binary_float, d binary_double, n number)");
-    MustRun("insert into r values(0.1, 0.1 + 0.2, 0.1 + 0.2)");
-    MustRun("insert into r values(16777217, 123456789012345678901, '1.5')");
+    MustRun("create table r(f binary_float, d binary_double, n number)",
+            "insert into r values(0.1, 0.1 + 0.2, 0.1 + 0.2), (16777217, 123456789012345678901, '1.5')");
     const struct { const char* column; const char* first; const char* last; } columns[] = {
         {"f", ".1", "16777216"}, {"d", ".30000000000000004", "123456789012345680000"}, {"n", ".3", "1.5"}};
     for (const auto& c : columns) {
@@ -188,22 +171,16 @@ TEST_F(Conversions, BinaryColumnsKeepTheirReals) {
 // Values of single-precision columns have the digits of that width, whatever engine or type shows them.
 TEST_F(Conversions, SinglePrecisionColumns) {
     MustRun("create table r(f binary_float)");
-    sb4 row = 0;
     for (const float value : {0.1f, 3.4028235e38f, 1.17549435e-38f, 16777216.0f, -1.5f}) {
         MustRun("delete from r");
-        ASSERT_EQ(Prepare("insert into r values(:1)"), 0);
-        ASSERT_EQ(Bind(1, {const_cast<float*>(&value), 4, SQLT_IBFLOAT}), 0);
+        ASSERT_EQ(Ready("insert into r values(:1)", {{const_cast<float*>(&value), 4, SQLT_IBFLOAT}}), 0);
         ASSERT_EQ(Execute(), 0);
         float single = 0;
         double wide = 0;
         OCINumber number{};
         char text[60] = "";
-        const struct { dvoid* at; sb4 size; ub2 type; } areas[] = {
-            {&single, 4, SQLT_IBFLOAT}, {&wide, 8, SQLT_IBDOUBLE}, {&number, 22, SQLT_VNU}, {text, 60, SQLT_STR}};
-        ASSERT_EQ(Prepare("select f, f, f, f from r"), 0);
-        for (ub4 column = 0; column < 4; ++column)
-            ASSERT_EQ(Define(column + 1, {areas[column].at, areas[column].size, areas[column].type}), 0);
-        ASSERT_EQ(Execute(1), 0) << row++;
+        ASSERT_EQ(Query("select f, f, f, f from r", {{&single, 4, SQLT_IBFLOAT}, {&wide, 8, SQLT_IBDOUBLE},
+                                                     {&number, 22, SQLT_VNU}, Text(text)}), 0) << value;
         EXPECT_EQ(single, value);
         EXPECT_EQ(static_cast<float>(wide), value);
         EXPECT_EQ(std::strtof(text, nullptr), value) << text;
@@ -228,8 +205,7 @@ TEST_F(Conversions, PackedDecimalWithScale) {
     OCIDefine* define = nullptr;
     char area[4] = "";
     ASSERT_EQ(Prepare("select -123.456 from dual"), 0);
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)),
-              0);
+    ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
     ub2 precision = 5;
     sb2 scale = 2;
     ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &precision, 0, OCI_ATTR_PDPRC, err)), 0);
@@ -237,53 +213,46 @@ TEST_F(Conversions, PackedDecimalWithScale) {
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(Hex(std::string(area, 4)), "0012346D");
     ASSERT_EQ(Prepare("select 1234.5 from dual"), 0);
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt, &define, err, 1, area, 4, SQLT_PDN, nullptr, nullptr, nullptr, OCI_DEFAULT)),
-              0);
+    ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
     EXPECT_EQ(Execute(1), 1457) << "six digits, and the precision is five";
 }
 
 TEST_F(Conversions, Dates) {
-    MustRun("create table d(d date, s timestamp, v varchar2(30))");
-    MustRun("insert into d values(date '2024-02-29', timestamp '2024-02-29 13:05:00.25', '29-FEB-24')");
+    MustRun("create table d(d date, s timestamp, v varchar2(30))",
+            "insert into d values(date '2024-02-29', timestamp '2024-02-29 13:05:00.25', '29-FEB-24')");
     EXPECT_EQ(One("select d from d"), "29-FEB-24");
     EXPECT_EQ(One("select s from d"), "29-FEB-24 01.05.00.250000 PM");
     const std::string day = Raw<ub1>(120) + Raw<ub1>(124) + "\x02\x1D\x01\x01\x01";
     const auto fetch = [&](const char* column, ub2 type, sb4 size) {
         std::string area(static_cast<std::size_t>(size), '\0');
-        sb4 answer = Prepare(std::string("select ") + column + " from d");
-        if (answer == 0) answer = Define(1, {area.data(), size, type});
-        if (answer == 0) answer = Execute(1);
+        const sb4 answer = Query(std::string("select ") + column + " from d", {{area.data(), size, type}});
         return answer == 0 ? Hex(area) : "!" + std::to_string(answer);
     };
-    EXPECT_EQ(fetch("d", SQLT_DAT, 7), Hex(day));
-    EXPECT_EQ(fetch("v", SQLT_DAT, 7), Hex(day)) << "text in the default model";
-    EXPECT_EQ(fetch("s", SQLT_DAT, 7), Hex(day.substr(0, 4) + "\x0E\x06\x01"));
-    EXPECT_EQ(fetch("1", SQLT_DAT, 7), "!932");
-    EXPECT_EQ(fetch("'31-FEB-24'", SQLT_DAT, 7), "!1839");
-    EXPECT_EQ(fetch("'no date'", SQLT_ODT, 8).substr(0, 3), "!18");
+    const struct { const char* column; std::string seen; } cases[] = {
+        {"d", Hex(day)}, {"v" /* text in the default model */, Hex(day)}, {"s", Hex(day.substr(0, 4) + "\x0E\x06\x01")},
+        {"1", "!932"}, {"'31-FEB-24'", "!1839"}};
+    for (const auto& c : cases) EXPECT_EQ(fetch(c.column, SQLT_DAT, 7), c.seen) << c.column;
+    EXPECT_EQ(fetch("'no date'", SQLT_ODT, 8), "!1858");
     const OCIDate oci{2024, 2, 29, {0, 0, 0}};
     EXPECT_EQ(fetch("d", SQLT_ODT, 8).substr(0, 14), Hex(Raw(oci)).substr(0, 14));
 
     EXPECT_EQ(In(day, SQLT_DAT), "'2024-02-29 00:00:00'");
     EXPECT_EQ(In(Raw(oci), SQLT_ODT), "'2024-02-29 00:00:00'");
     EXPECT_EQ(In(Raw(OCIDate{2024, 2, 30, {0, 0, 0}}), SQLT_ODT), "!1839");
-    EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT).substr(0, 3), "!18");
+    EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT), "!1841");
 }
 
 TEST_F(Conversions, DatetimeDescriptors) {
     auto* datetime = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
     const std::string element = Raw(datetime);
     EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!1866") << "never set";
-    ASSERT_EQ(Prepare("select timestamp '2024-02-29 13:05:07.5' from dual"), 0);
-    ASSERT_EQ(Define(1, {&datetime, 8, SQLT_TIMESTAMP}), 0);
-    ASSERT_EQ(Execute(1), 0);
+    const char* const query = "select timestamp '2024-02-29 13:05:07.5' from dual";
+    ASSERT_EQ(Query(query, {{&datetime, 8, SQLT_TIMESTAMP}}), 0);
     EXPECT_EQ(In(element, SQLT_TIMESTAMP), "'2024-02-29 13:05:07.5'");
     void* const wrong[] = {nullptr, stmt, this};
     for (void* pointer : wrong) {
         EXPECT_EQ(In(Raw(pointer), SQLT_TIMESTAMP), "!21710");
-        ASSERT_EQ(Prepare("select timestamp '2024-02-29 13:05:07.5' from dual"), 0);
-        ASSERT_EQ(Define(1, {&pointer, 8, SQLT_DATE}), 0);
-        EXPECT_EQ(Execute(1), 21710);
+        EXPECT_EQ(Query(query, {{&pointer, 8, SQLT_DATE}}), 21710);
     }
     EXPECT_EQ(OCIDescriptorFree(datetime, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
     EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!21710") << "freed";
@@ -295,9 +264,8 @@ TEST_F(Conversions, ATimeAloneIsNoDate) {
     EXPECT_EQ(In(Raw(time), SQLT_TIME, ":1"), "10:20:30");
     MustRun("create table moments(d date, t timestamp)");
     for (const char* column : {"d", "t"}) {
-        ASSERT_EQ(Prepare("insert into moments(" + std::string(column) + ") values(:1)"), 0);
-        ASSERT_EQ(Bind(1, {&time, sizeof time, SQLT_TIME}), 0);
-        EXPECT_NE(Execute(), 0) << column;
+        ASSERT_EQ(Ready("insert into moments(" + std::string(column) + ") values(:1)", {{&time, 8, SQLT_TIME}}), 0);
+        EXPECT_EQ(Execute(), 1843) << column;
     }
     EXPECT_EQ(One("select count(*) from moments"), "0");
     EXPECT_EQ(One("select cast('10:20:30' as timestamp) from dual"), "0000-00-00 10:20:30") << "as it is";
@@ -306,10 +274,7 @@ TEST_F(Conversions, ATimeAloneIsNoDate) {
 TEST_F(Conversions, StringsAndRaws) {
     OCIString* string = nullptr;
     OCIRaw* raw = nullptr;
-    ASSERT_EQ(Prepare("select 'abc', x'00FF' from dual"), 0);
-    ASSERT_EQ(Define(1, {&string, 8, SQLT_VST}), 0);
-    ASSERT_EQ(Define(2, {&raw, 8, SQLT_LVB}), 0);
-    ASSERT_EQ(Execute(1), 0);
+    ASSERT_EQ(Query("select 'abc', x'00FF' from dual", {{&string, 8, SQLT_VST}, {&raw, 8, SQLT_LVB}}), 0);
     EXPECT_EQ(std::string(reinterpret_cast<char*>(OCIStringPtr(env, string)), OCIStringSize(env, string)), "abc");
     EXPECT_EQ(Hex(std::string(reinterpret_cast<char*>(OCIRawPtr(env, raw)), OCIRawSize(env, raw))), "00FF");
     EXPECT_EQ(In(Raw(string), SQLT_VST), "'abc'");
@@ -325,8 +290,7 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {"abc", SQLT_CHR, 4, "!1485"},
         {"abc", SQLT_AFC, -1, "'abc'"}, {"ab ", SQLT_AFC, -1, "'ab '"}, {"", SQLT_CHR, -1, "NULL"},
         {bytes("abc\0x", 5), SQLT_STR, -1, "'abc'"}, {bytes("abc\0", 4), SQLT_STR, 2, "'ab'"},
-        {"abc", SQLT_STR, -1, "!1480"},
-        {"abc", SQLT_STR, 3, "'abc'"}, {bytes("\0", 1), SQLT_STR, -1, "NULL"},
+        {"abc", SQLT_STR, -1, "!1480"}, {"abc", SQLT_STR, 3, "'abc'"}, {bytes("\0", 1), SQLT_STR, -1, "NULL"},
         {bytes("\2\0abc", 5), SQLT_VCS, -1, "'ab'"}, {bytes("\3\0abc", 5), SQLT_AVC, 1, "'abc'"},
         {bytes("\4\0abc", 5), SQLT_VCS, -1, "!1458"}, {bytes("\377\377abc", 5), SQLT_AVC, -1, "!1458"},
         {bytes("\1\0\0\0abc", 7), SQLT_LVC, -1, "'a'"}, {bytes("\377\377\377\377abc", 7), SQLT_LVC, -1, "!1458"},
@@ -360,8 +324,7 @@ TEST_F(Conversions, SizesThatATypeCannotHave) {
         {SQLT_CHR, -1, 1459}, {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459},
         {SQLT_LVC, 3, 1459},
         {SQLT_BIN, -5, 1459}, {SQLT_VBI, 1, 1459}, {SQLT_VST, 4, 1483}, {SQLT_VST, 0, 0}, {SQLT_RSET, -1, 0},
-        {SQLT_TIME, 7, 1483},
-        {0, 8, 3115}, {10, 8, 3115}, {SQLT_NTY, 8, 3115}, {9999, 8, 3115},
+        {SQLT_TIME, 7, 1483}, {0, 8, 3115}, {10, 8, 3115}, {SQLT_NTY, 8, 3115}, {9999, 8, 3115},
     };
     char area[200] = "";
     for (const auto& c : cases) {
@@ -376,15 +339,11 @@ TEST_F(Conversions, LargeObjectsAsTextAndBytes) {
     MustRun("create table l(c clob, b blob)");
     std::string text(100000, 'x');
     text += "end";
-    ASSERT_EQ(Prepare("insert into l values(:1, :2)"), 0);
-    ASSERT_EQ(Bind(1, {text.data(), static_cast<sb4>(text.size()), SQLT_CHR}), 0);
-    ASSERT_EQ(Bind(2, {text.data(), static_cast<sb4>(text.size()), SQLT_LBI}), 0);
+    const auto size = static_cast<sb4>(text.size());
+    ASSERT_EQ(Ready("insert into l values(:1, :2)", {{text.data(), size, SQLT_CHR}, {text.data(), size, SQLT_LBI}}), 0);
     ASSERT_EQ(Execute(), 0);
     std::string out[2] = {std::string(text.size() + 1, '#'), std::string(text.size(), '#')};
-    ASSERT_EQ(Prepare("select c, b from l"), 0);
-    ASSERT_EQ(Define(1, {out[0].data(), static_cast<sb4>(out[0].size()), SQLT_STR}), 0);
-    ASSERT_EQ(Define(2, {out[1].data(), static_cast<sb4>(out[1].size()), SQLT_BIN}), 0);
-    ASSERT_EQ(Execute(1), 0);
+    ASSERT_EQ(Query("select c, b from l", {{out[0].data(), size + 1, SQLT_STR}, {out[1].data(), size, SQLT_BIN}}), 0);
     EXPECT_STREQ(out[0].c_str(), text.c_str());
     EXPECT_EQ(out[1], text);
 }
@@ -396,29 +355,23 @@ protected:
 
 TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
     const struct { const char* expression; ub2 type; sb4 size; const char* hex; ub2 length; } cases[] = {
-        {"'ab'", SQLT_CHR, 5, "6100620023", 4},
-        {"'ab'", SQLT_CHR, 3, "610023", 2},
-        {"'ab'", SQLT_STR, 6, "610062000000", 4},
-        {"'ab'", SQLT_STR, 5, "6100000023", 2},
-        {"'ab'", SQLT_AFC, 6, "610062002000", 6},
-        {"'ab'", SQLT_VCS, 6, "040061006200", 6},
-        {"12.5", SQLT_CHR, 8, "310032002E003500", 8},
-        {"x'FF'", SQLT_BIN, 1, "FF", 1},
+        {"'ab'", SQLT_CHR, 5, "6100620023", 4}, {"'ab'", SQLT_CHR, 3, "610023", 2},
+        {"'ab'", SQLT_STR, 6, "610062000000", 4}, {"'ab'", SQLT_STR, 5, "6100000023", 2},
+        {"'ab'", SQLT_AFC, 6, "610062002000", 6}, {"'ab'", SQLT_VCS, 6, "040061006200", 6},
+        {"12.5", SQLT_CHR, 8, "310032002E003500", 8}, {"x'FF'", SQLT_BIN, 1, "FF", 1},
         {"char(128512)", SQLT_CHR, 3, "232323", 0},    // a pair that does not fit is left out whole
     };
     for (const auto& c : cases) {
         EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << Shown(c.expression, c.type, c.size);
         EXPECT_EQ(length_, c.length) << Shown(c.expression, c.type, c.size);
     }
-    ASSERT_EQ(Prepare("select length(:1), :2 from dual"), 0);
     std::string in = Encoded("abc");
     std::string terminated = Encoded("xy") + std::string(2, '\0');
     sb4 count = 0;
     char out[10] = "";
-    ASSERT_EQ(Bind(1, {in.data(), static_cast<sb4>(in.size()), SQLT_CHR}), 0);
-    ASSERT_EQ(BindName("2", {terminated.data(), static_cast<sb4>(terminated.size()), SQLT_STR}), 0);
-    ASSERT_EQ(Define(1, {&count, 4, SQLT_INT}), 0);
-    ASSERT_EQ(Define(2, {out, 10, SQLT_STR}), 0);
+    ASSERT_EQ(Ready("select length(:1), :2 from dual",
+                    {{in.data(), 6, SQLT_CHR}, {terminated.data(), 6, SQLT_STR}}), 0);
+    ASSERT_EQ(Define(1, Int(count)) + Define(2, Text(out)), 0);
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(count, 3);
     EXPECT_EQ(std::string(out, 6), terminated);
@@ -434,8 +387,8 @@ TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
     ASSERT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, &text, &length, OCI_ATTR_STATEMENT, err)), 0);
     EXPECT_EQ(length, 70u);
     char value[8] = "";
-    ASSERT_EQ(BindName(":Name", {value, 8, SQLT_STR}), 0);
-    EXPECT_NE(Execute(0), 0);
+    ASSERT_EQ(BindName(":Name", Text(value)), 0);
+    EXPECT_EQ(Execute(0), 921);
     EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET) % 2, 0) << "bytes of whole units";
     OraText* names[1];
     ub1 lengths[1];
