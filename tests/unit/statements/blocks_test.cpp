@@ -113,6 +113,11 @@ TEST_F(Blocks, TablesAtTheirLimits) {
         EXPECT_EQ(current, c.current) << c.most;
         EXPECT_EQ(got, c.got) << c.most;
     }
+    // Beside a plain bind a table takes one row.
+    sb4 wide[4] = {}, plain = 0;
+    ASSERT_EQ(Prepare("begin select a, a into :1, :2 from t order by a; end;"), 0);
+    ASSERT_EQ(Bind(1, Int(wide), OCI_DEFAULT, 4, &(current = 0)) + Bind(2, Int(plain)), 0);
+    EXPECT_EQ(Execute(), 1414);
     // From one table into another that is just full, and one element short.
     for (const ub4 most : {3u, 2u}) {
         sb4 got[4] = {-1, -1, -1, -1};

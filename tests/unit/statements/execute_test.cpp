@@ -45,19 +45,13 @@ TEST_F(Executing, WhatIsWrongWithTheCall) {
     stmt = New<OCIStmt>(OCI_HTYPE_STMT);
     EXPECT_EQ(Execute(), 24337);
     const struct { const char* sql; ub4 iterations, first, mode; sb4 answer; } cases[] = {
-        {"insert into t values(1)", 0, 0, OCI_DEFAULT, 24333},
-        {"insert into t values(1)", 2, 2, OCI_DEFAULT, 24333},
-        {"insert into t values(1)", 1, 3, OCI_DEFAULT, 24333},
-        {"insert into t values(1)", 1, 0, 0x1000, 24300},
+        {"insert into t values(1)", 0, 0, OCI_DEFAULT, 24333}, {"insert into t values(1)", 2, 2, OCI_DEFAULT, 24333},
+        {"insert into t values(1)", 1, 3, OCI_DEFAULT, 24333}, {"insert into t values(1)", 1, 0, 0x1000, 24300},
         {"insert into t values(1)", 1, 0, OCI_DESCRIBE_ONLY | OCI_PARSE_ONLY, 24380},
-        {"insert into t values(:a)", 1, 0, OCI_DEFAULT, 1008},
-        {"create table u(a number)", 2, 0, OCI_DEFAULT, 24969},
-        {"create table u as select :a from t", 1, 0, OCI_DEFAULT, 1027},
-        {"commit", 2, 0, OCI_DEFAULT, 24969},
-        {"select * from t", 1, 0, OCI_DEFAULT, 24374},
-        {"select * from missing", 0, 0, OCI_DEFAULT, 942},
-        {"select 'x from t", 0, 0, OCI_DEFAULT, 1756},
-        {"select 1; select 2", 0, 0, OCI_DEFAULT, 933},
+        {"insert into t values(:a)", 1, 0, OCI_DEFAULT, 1008}, {"create table u(a number)", 2, 0, OCI_DEFAULT, 24969},
+        {"create table u as select :a from t", 1, 0, OCI_DEFAULT, 1027}, {"commit", 2, 0, OCI_DEFAULT, 24969},
+        {"select * from t", 1, 0, OCI_DEFAULT, 24374}, {"select * from missing", 0, 0, OCI_DEFAULT, 942},
+        {"select 'x from t", 0, 0, OCI_DEFAULT, 1756}, {"select 1; select 2", 0, 0, OCI_DEFAULT, 933},
     };
     for (const auto& c : cases) {
         ASSERT_EQ(Prepare(c.sql), 0) << c.sql;

@@ -70,12 +70,9 @@ TEST_F(Fetching, WhatIsWrongWithTheCall) {
 // The published table: rows are null or truncated, columns are whether indicators and return codes are given.
 TEST_F(Fetching, NullsAndTruncation) {
     const struct { bool truncated, indicators, codes; sword rc; sb4 number; sb2 indicator; ub2 code; } cases[] = {
-        {false, false, false, OCI_ERROR, 1405, 9, 9},
-        {false, false, true, OCI_ERROR, 1405, 9, 1405},
-        {false, true, false, OCI_SUCCESS, 0, -1, 9},
-        {false, true, true, OCI_SUCCESS, 0, -1, 1405},
-        {true, false, false, OCI_ERROR, 1406, 9, 9},
-        {true, true, false, OCI_ERROR, 1406, 5, 9},
+        {false, false, false, OCI_ERROR, 1405, 9, 9}, {false, false, true, OCI_ERROR, 1405, 9, 1405},
+        {false, true, false, OCI_SUCCESS, 0, -1, 9}, {false, true, true, OCI_SUCCESS, 0, -1, 1405},
+        {true, false, false, OCI_ERROR, 1406, 9, 9}, {true, true, false, OCI_ERROR, 1406, 5, 9},
         {true, false, true, OCI_SUCCESS_WITH_INFO, 24345, 9, 1406},
         {true, true, true, OCI_SUCCESS_WITH_INFO, 24345, 5, 1406},
     };

@@ -376,10 +376,8 @@ protected:
 TEST_F(Utf16Pieces, EndBetweenCharacters) {
     using std::string_view;
     const struct { const char* value; ub2 type; ub4 room; std::u16string_view first; string_view closed; } cases[] = {
-        {"'ab'", SQLT_STR, 4, u"a", string_view("\0\0", 2)},
-        {"'ab'", SQLT_STR, 5, u"a", string_view("\0\0", 2)},
-        {"'ab'", SQLT_CHR, 3, u"a", "#"},
-        {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 4, u"a", "#"},
+        {"'ab'", SQLT_STR, 4, u"a", string_view("\0\0", 2)}, {"'ab'", SQLT_STR, 5, u"a", string_view("\0\0", 2)},
+        {"'ab'", SQLT_CHR, 3, u"a", "#"}, {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 4, u"a", "#"},
         {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 6, u"a\U0001F600", "#"},
     };
     for (const auto& c : cases) {
