@@ -57,7 +57,10 @@ Status Statement::Execute(const ExecuteTarget& target, ErrorHandle& error, const
 Status Statement::ExecuteNow(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
     const PieceStream::Use wants = pieces_.Wants();
     if (wants == PieceStream::Use::execute) return ContinueExecute(error);
-    if (wants == PieceStream::Use::fetch_by_execute) return ContinueFetch();
+    if (wants == PieceStream::Use::fetch_by_execute) {
+        const ExecuteArguments started = pieces_.Arguments();
+        return Complete(EndExactFetch(ContinueFetch(), started), started);
+    }
     if (Status status = Ready(target, arguments); !status.Ok()) return status;
     error.row_failures.clear();
     error.row_offset = 0;
@@ -200,9 +203,15 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
 Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     const ub4 rows = arguments.iterations - arguments.first;
     if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) return status;
-    if (defines_.InPieces()) return StartFetchInPieces(rows, arguments.first, nullptr, true);
-    Status status = FetchRows(rows, arguments.first, nullptr);
-    if (!(arguments.mode & OCI_EXACT_FETCH)) return status;
+    Status status = defines_.InPieces() ? StartFetchInPieces(rows, arguments.first, nullptr, &arguments)
+                                        : FetchRows(rows, arguments.first, nullptr);
+    return EndExactFetch(std::move(status), arguments);
+}
+
+// Once the rows are delivered, pieces and all.
+Status Statement::EndExactFetch(Status status, const ExecuteArguments& arguments) {
+    if (!(arguments.mode & OCI_EXACT_FETCH) || status.Code() == OCI_NEED_DATA) return status;
+    if (pieces_.Wants() != PieceStream::Use::none) return status;    // it may be asked again with a better buffer
     bool more = false;
     if (!status.Failed() && status.Code() != OCI_NO_DATA) {
         if (Status next = run_.cursor.AnyMore(more); !next.Ok()) status = std::move(next);

@@ -41,7 +41,7 @@ Status Statement::FetchNow(ub4 rows, ub2 orientation, sb4 offset) {
     } else if (orientation != OCI_DEFAULT && orientation != OCI_FETCH_NEXT) {
         return Error(errors::kBadFetch);
     }
-    return defines_.InPieces() ? StartFetchInPieces(rows, 0, position, false) : FetchRows(rows, 0, position);
+    return defines_.InPieces() ? StartFetchInPieces(rows, 0, position, nullptr) : FetchRows(rows, 0, position);
 }
 
 // The position of the first row that is wanted of a scrollable cursor; 0 is before them.

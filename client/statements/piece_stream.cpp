@@ -140,10 +140,10 @@ void PieceStream::NextIteration() noexcept {
 
 // ---- Coming out
 
-void PieceStream::StartFetch(ub4 end, bool by_execute) noexcept {
+void PieceStream::StartFetch(ub4 end, bool by_execute, ub4 mode) noexcept {
     End();
     use_ = by_execute ? Use::fetch_by_execute : Use::fetch;
-    arguments_ = {end, 0, 0};
+    arguments_ = {end, 0, mode};
     wanted_.out = true;
 }
 

@@ -81,7 +81,7 @@ public:
     [[nodiscard]] const ExecuteArguments& Arguments() const { return arguments_; }
 
     // Coming out: rows up to element `end`, each Begun before it is handed out.
-    void StartFetch(ub4 end, bool by_execute) noexcept;
+    void StartFetch(ub4 end, bool by_execute, ub4 mode) noexcept;
     void Begin(ub4 row, std::span<const engine::Datum> values);
     // Ok when the row is taken; its defines are those of `defines`.
     Status HandOut(const Defines& defines, PieceDriver& driver);

@@ -31,9 +31,10 @@ Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) {
 
 // ---- Fetching
 
-// `rows` rows into the elements from `first` on.
-Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position, bool by_execute) {
-    pieces_.StartFetch(first + rows, by_execute);
+// `rows` rows into the elements from `first` on. `execute`: what the execute that delivers them was asked for, or null.
+Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position,
+                                     const ExecuteArguments* execute) {
+    pieces_.StartFetch(first + rows, execute != nullptr, execute ? execute->mode : ub4{OCI_DEFAULT});
     Status status = NextRowInPieces(first, position);
     return status.Ok() ? ContinueFetch() : status;
 }

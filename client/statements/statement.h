@@ -143,6 +143,7 @@ private:
     Status RunControl(const ExecuteArguments& arguments);
     Status Finish(ErrorHandle& error, const ExecuteArguments& arguments);
     Status FetchAtExecute(const ExecuteArguments& arguments);
+    Status EndExactFetch(Status status, const ExecuteArguments& arguments);
     void AddNotices(ErrorHandle& error, Status& status);
 
     // block.cpp
@@ -167,7 +168,7 @@ private:
     Status EndOfFetch();
 
     // pieces.cpp
-    Status StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position, bool by_execute);
+    Status StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position, const ExecuteArguments* execute);
     Status NextRowInPieces(ub4 row, const std::uint64_t* position);
     Status ContinueFetch();
     Status StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments);

@@ -367,6 +367,30 @@ TEST_F(PieceByPiece, ADefineFreedBeforeItsTurn) {
     EXPECT_EQ(FetchCode(), OCI_NO_DATA);
 }
 
+// What the execute was asked for holds when the last piece of its rows is taken.
+TEST_F(PieceByPiece, AnExecuteThatDeliversThemLooksFurtherAndCommits) {
+    const struct { ub4 rows; sb4 answer; int kept; } cases[] = {{2, 0, 2}, {1, 1422, 1}};
+    for (const auto& c : cases) {
+        MustRun("create table t(id number, name varchar2(9))", "insert into t values(1, 'a')", "commit",
+                "insert into t values(2, 'b')");
+        ASSERT_EQ(Query("select name from t order by id", {InPieces(SQLT_CHR)}, 0), 0);
+        sword rc = ExecuteCode(c.rows, OCI_EXACT_FETCH | OCI_COMMIT_ON_SUCCESS);
+        for (ub4 row = 0; row < c.rows; ++row) {
+            ASSERT_EQ(rc, OCI_NEED_DATA) << c.rows;
+            char buffer[9];
+            ub4 length = sizeof buffer;
+            ASSERT_EQ(Set(buffer, &length, OCI_NEXT_PIECE), 0);
+            rc = ExecuteCode(c.rows, OCI_EXACT_FETCH | OCI_COMMIT_ON_SUCCESS);
+        }
+        EXPECT_EQ(Answer(rc), c.answer) << c.rows;
+        MustRun("rollback");
+        int kept = 0;
+        ASSERT_EQ(Query("select count(*) from t", {Int(kept)}), 0);
+        EXPECT_EQ(kept, c.kept) << c.rows;
+        MustRun("drop table t");
+    }
+}
+
 class Utf16Pieces : public PieceByPiece {
 protected:
     Utf16Pieces() : PieceByPiece(OCI_UTF16) {}
