@@ -27,7 +27,10 @@ void AddStatementCommands(HandlerTable& handlers);
 void AddStringCommands(HandlerTable& handlers);
 void AddStructCommands(HandlerTable& handlers);
 void AddThreadCommands(HandlerTable& handlers);
+void AddTransactionCommands(HandlerTable& handlers);
 void AddUtilityCommands(HandlerTable& handlers);
+void AddXaCommands(HandlerTable& handlers);
+void AddXaHandleCommands(HandlerTable& handlers);
 void AddXidCommands(HandlerTable& handlers);
 
 inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
@@ -54,6 +57,9 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddStringCommands,
     AddStructCommands,
     AddThreadCommands,
+    AddTransactionCommands,
     AddUtilityCommands,
+    AddXaCommands,
+    AddXaHandleCommands,
     AddXidCommands,
 };

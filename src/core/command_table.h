@@ -58,8 +58,8 @@ constexpr WordCounts WordsFrom(int first) {
 // For a command that checks its word count itself.
 inline constexpr WordCounts kAnyWords{1, true};
 
-// What every row of every shape begins with. A count that `words` does not hold prints the usage text as invalid syntax
-// and nothing else happens: the dispatcher sees to that, no handler does.
+// What every row of every shape begins with. A count that `words` does not hold prints the usage text as invalid syntax,
+// or as it is where it begins with "Usage: ", and nothing else happens: the dispatcher sees to that, no handler does.
 struct CommandRow {
     Code code;
     WordCounts words;

@@ -18,21 +18,24 @@ void ComplainOfEmptyWord() {
     Message(kError, "DecodeKeyword(): Null length token.\n");
 }
 
-// The first row whose keyword the word begins, or null.
-const KeywordTable* FindRow(std::string_view word, const KeywordTable* table) {
+enum class Match { beginning, whole };
+
+// The first row whose keyword the word begins, or is; null without one.
+const KeywordTable* FindRow(std::string_view word, const KeywordTable* table, Match match = Match::beginning) {
     char folded[kLongestWord];
     if (word.empty() || word.size() > sizeof folded) return nullptr;  // no keyword is that long
     for (size_t index = 0; index < word.size(); ++index)
         folded[index] = static_cast<char>(std::tolower(static_cast<unsigned char>(word[index])));
     for (const KeywordTable* row = table; row->keyword != nullptr; ++row) {
         if (row->keyword[0] == '\0') continue;
-        if (std::strncmp(folded, row->keyword, word.size()) == 0) return row;
+        if (std::strncmp(folded, row->keyword, word.size()) != 0) continue;
+        if (match == Match::beginning || row->keyword[word.size()] == '\0') return row;
     }
     return nullptr;
 }
 
 // One word of a bitmask: ORs its value into `mask`, or complains. Returns whether it matched.
-bool AddWord(std::string_view text, const KeywordTable* table, int& mask) {
+bool AddWord(std::string_view text, const KeywordTable* table, Match match, int& mask) {
     char word[kLongestWord];
     size_t length = 0;
     for (const char character : text) {
@@ -44,7 +47,7 @@ bool AddWord(std::string_view text, const KeywordTable* table, int& mask) {
         ComplainOfEmptyWord();
         return false;
     }
-    const KeywordTable* row = FindRow({word, length}, table);
+    const KeywordTable* row = FindRow({word, length}, table, match);
     if (row == nullptr) {
         Message(kOutput, "Warning : Unrecognized Token in bitmask : %.*s\n", static_cast<int>(length), word);
         return false;
@@ -54,11 +57,11 @@ bool AddWord(std::string_view text, const KeywordTable* table, int& mask) {
 }
 
 // Returns whether any word matched.
-bool Decode(std::string_view rest, const KeywordTable* table, int& mask) {
+bool Decode(std::string_view rest, const KeywordTable* table, int& mask, Match match = Match::beginning) {
     bool matched = false;
     for (;;) {
         const size_t bar = rest.find('|');
-        matched |= AddWord(rest.substr(0, bar), table, mask);
+        matched |= AddWord(rest.substr(0, bar), table, match, mask);
         if (bar == std::string_view::npos) return matched;
         rest.remove_prefix(bar + 1);
     }
@@ -80,6 +83,12 @@ int DecodeKeyword(const char* word, const KeywordTable* table) {
 int DecodeBitmask(const char* word, const KeywordTable* table) {
     int mask = 0;
     Decode(TextOf(word), table, mask);
+    return mask;
+}
+
+int DecodeWholeWords(const char* word, const KeywordTable* table) {
+    int mask = 0;
+    Decode(TextOf(word), table, mask, Match::whole);
     return mask;
 }
 

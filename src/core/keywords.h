@@ -12,6 +12,8 @@ int DecodeKeyword(const char* word, const KeywordTable* table);
 // The OR of the values of the words joined by "|"; blanks are ignored. A word that matches nothing prints a warning
 // and adds nothing.
 int DecodeBitmask(const char* word, const KeywordTable* table);
+// The same, but a word must be the keyword as a whole.
+int DecodeWholeWords(const char* word, const KeywordTable* table);
 
 // As above; a word of which nothing matched is read as a decimal number (a bitmask has warned by then).
 int DecodeKeywordOrNumber(const char* word, const KeywordTable* table);

@@ -1,6 +1,8 @@
 // Finds the command that a line names, checks its word count and runs its handler.
 #include "loop/dispatch.h"
 
+#include <string_view>
+
 #include "commands/families.h"
 #include "core/messages.h"
 #include "loop/script.h"
@@ -18,10 +20,16 @@ HandlerTable AllHandlers() {
     return handlers;
 }
 
+// A usage text that says so itself is not said to be invalid syntax.
+void ComplainOfWordCount(const std::string_view usage) {
+    if (usage.starts_with("Usage: ")) Message(kError, "%s\n", usage.data());
+    else InvalidSyntax(usage.data());
+}
+
 void RunHandler(Code code, int count, char** words) {
     const HandlerTable::Handler* handler = Handlers().Find(code);
     if (handler == nullptr) return Message(kError, "ReadAndEvaluateScript(): Case error !\n");
-    if (!handler->row->words.Has(count)) return InvalidSyntax(handler->row->usage);
+    if (!handler->row->words.Has(count)) return ComplainOfWordCount(handler->row->usage);
     handler->run(*handler->row, count, words);
 }
 

@@ -8,14 +8,14 @@
 #include "platform/client_library.h"
 
 #include <dlfcn.h>
-#include <unistd.h>
 
-#include <climits>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
 #include <string_view>
 #include <vector>
+
+#include "platform/executable.h"
 
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
 #define SANITIZED 1
@@ -58,14 +58,6 @@ void Complain(const std::string& text) {
 const char* Setting(const char* variable, const char* otherwise) {
     const char* value = std::getenv(variable);
     return value && *value ? value : otherwise;
-}
-
-std::string ExecutableDirectory() {
-    char path[PATH_MAX];
-    const ssize_t length = readlink("/proc/self/exe", path, sizeof path);
-    if (length <= 0) return ".";
-    const std::string_view whole(path, static_cast<std::size_t>(length));
-    return std::string(whole.substr(0, whole.rfind('/')));
 }
 
 std::vector<std::string> Candidates() {

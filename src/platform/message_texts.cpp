@@ -1,4 +1,4 @@
-// Wordings of SQLSTATEs, and texts in lines.
+// Texts out of the catalogue, in lines.
 #include "platform/message_texts.h"
 
 #include <algorithm>
@@ -7,56 +7,9 @@
 #include <string>
 #include <string_view>
 
+#include "platform/message_catalogue.h"
+
 namespace {
-
-struct Meaning {
-    std::string_view code;    // five characters, or the two of a class
-    std::string_view text;
-};
-
-constexpr Meaning kMeanings[] = {
-    {"01", "warning"},
-    {"02", "no data"},
-    {"07", "dynamic SQL error"},
-    {"08", "connection exception"},
-    {"0A", "feature not supported"},
-    {"21", "cardinality violation"},
-    {"22", "data exception"},
-    {"22001", "data exception: string data, right truncation"},
-    {"22002", "data exception: null value, no indicator parameter"},
-    {"22003", "data exception: numeric value out of range"},
-    {"22008", "data exception: datetime field overflow"},
-    {"22012", "data exception: division by zero"},
-    {"22023", "data exception: invalid parameter value"},
-    {"22024", "data exception: unterminated C string"},
-    {"22025", "data exception: invalid escape sequence"},
-    {"23", "integrity constraint violation"},
-    {"24", "invalid cursor state"},
-    {"25", "invalid transaction state"},
-    {"26", "invalid SQL statement name"},
-    {"28", "invalid authorization"},
-    {"2D", "invalid transaction termination"},
-    {"2E", "invalid connection name"},
-    {"34", "invalid cursor name"},
-    {"3D", "invalid catalog name"},
-    {"3F", "invalid schema name"},
-    {"40", "transaction rollback"},
-    {"40001", "transaction rollback: serialization failure"},
-    {"42", "syntax error or access rule violation"},
-    {"44", "with check option violation"},
-    {"60", "system error"},
-    {"61", "resource error"},
-    {"63", "path name or network error"},
-    {"65", "stored procedure error"},
-    {"66", "network error"},
-    {"72", "error of the SQL executor"},
-    {"HY", "general error"},
-};
-
-const Meaning* FindMeaning(std::string_view code) {
-    const auto row = std::ranges::find(kMeanings, code, &Meaning::code);
-    return row == std::end(kMeanings) ? nullptr : row;
-}
 
 // Where the first line of the text ends.
 std::size_t LineLength(std::string_view text, std::size_t width) {
@@ -90,21 +43,42 @@ std::string_view Words(const SQLCA& diagnostics) {
     return words;
 }
 
-}  // namespace
-
-std::size_t SqlcaMessageText(char* buffer, std::size_t capacity, std::size_t line_width, const SQLCA& diagnostics) {
-    const std::string_view words = Words(diagnostics);
-    if (diagnostics.sqlcode == 0 || !words.empty()) return CopyInLines(words, buffer, capacity, line_width);
-    const long long number = std::llabs(diagnostics.sqlcode);
+// "ORA-nnnnn". Of the diagnostics' codes 100 alone is no error number.
+std::string NumberOf(sb4 sqlcode) {
+    const long long number = sqlcode == 100 ? 1403 : std::llabs(sqlcode);
     std::string digits = std::to_string(number);
     if (digits.size() < 5) digits.insert(0, 5 - digits.size(), '0');
-    return CopyInLines("ORA-" + digits, buffer, capacity, line_width);
+    return "ORA-" + digits;
 }
 
-std::size_t SqlstateMessageText(char* buffer, std::size_t capacity, std::size_t line_width, const char* sqlstate) {
-    const std::string_view code(sqlstate, strnlen(sqlstate, sizeof(SQLCA::sqlstate)));
-    const Meaning* meaning = FindMeaning(code);
-    if (!meaning) meaning = FindMeaning(code.substr(0, 2));
-    if (code.size() != sizeof(SQLCA::sqlstate) || !meaning) return CopyInLines("", buffer, capacity, line_width);
-    return CopyInLines(std::string(code) + ": " + std::string(meaning->text), buffer, capacity, line_width);
+// Both with ": " between them, or the one that is there.
+std::string Joined(std::string_view left, std::string_view right) {
+    std::string text(left);
+    if (!left.empty() && !right.empty()) text += ": ";
+    return text.append(right);
+}
+
+}  // namespace
+
+std::size_t SqlcaMessageText(char* buffer, std::size_t capacity, std::size_t line_width, const char* catalogue,
+                             const SQLCA& diagnostics) {
+    std::string text;
+    if (diagnostics.sqlcode != 0) {
+        const std::string number = NumberOf(diagnostics.sqlcode);
+        text = Joined(number, MessageCatalogue(catalogue).Find(number));
+    }
+    return CopyInLines(Joined(text, Words(diagnostics)), buffer, capacity, line_width);
+}
+
+std::size_t SqlstateMessageText(char* buffer, std::size_t capacity, std::size_t line_width, const char* catalogue,
+                                const char* sqlstate) {
+    const std::string code(sqlstate, strnlen(sqlstate, sizeof(SQLCA::sqlstate)));
+    std::string text;
+    if (code.size() == sizeof(SQLCA::sqlstate)) {
+        const MessageCatalogue texts(catalogue);
+        std::string_view meaning = texts.Find("SQLSTATE " + code);
+        if (meaning.empty()) meaning = texts.Find("SQLSTATE " + code.substr(0, 2));
+        if (!meaning.empty()) text = Joined(code, meaning);
+    }
+    return CopyInLines(text, buffer, capacity, line_width);
 }

@@ -1,14 +1,19 @@
 // Packed decimal, decimal floats, numbers from text, tagged memory, message texts.
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
 #include <limits>
 #include <string>
 #include <vector>
 
 #include "platform/decimal_float.h"
 #include "platform/memory.h"
+#include "platform/message_catalogue.h"
 #include "platform/message_texts.h"
 #include "platform/numbers.h"
 #include "platform/packed_decimal.h"
@@ -120,23 +125,26 @@ TEST(Memory, RefusesWhatItDidNotGiveOut) {
 TEST(MessageTexts, OfDiagnosticsInLines) {
     SQLCA diagnostics{};
     diagnostics.sqlcode = -1017;
+    const char* catalogue = "kelpsql.mo";
     const auto text = [&](std::size_t width, std::size_t capacity = 100) {
         std::vector<char> area(capacity);
-        return std::string(area.data(), SqlcaMessageText(area.data(), capacity, width, diagnostics));
+        return std::string(area.data(), SqlcaMessageText(area.data(), capacity, width, catalogue, diagnostics));
     };
-    const std::string words = "invalid user name or password ";
-    EXPECT_EQ(text(80), "ORA-01017");
+    EXPECT_EQ(text(80), "ORA-01017: invalid user name or password; logon denied");
+    const std::string words = "by the server ";
     words.copy(diagnostics.sqlerrmc, words.size());
     diagnostics.sqlerrml = static_cast<sb2>(words.size());
-    EXPECT_EQ(text(80), "invalid user name or password");
-    EXPECT_EQ(text(12), "invalid user\nname or\npassword");
-    EXPECT_EQ(text(4), "inva\nlid\nuser\nname\nor\npass\nword");
-    EXPECT_EQ(text(12, 10), "invalid u");
-    EXPECT_EQ(text(0, 4), "i\nn");
-    EXPECT_EQ(text(80, 0), "");
+    EXPECT_EQ(text(80), "ORA-01017: invalid user name or password; logon denied: by the server");
     diagnostics.sqlerrml = 32767;
-    EXPECT_EQ(text(80), "invalid user name or password");
-    diagnostics = {};
+    EXPECT_EQ(text(12), "ORA-01017:\ninvalid user\nname or\npassword;\nlogon\ndenied: by\nthe server");
+    EXPECT_EQ(text(4, 30), "ORA-\n0101\n7:\ninva\nlid\nuser\nna");
+    EXPECT_EQ(text(0, 4), "O\nR");
+    EXPECT_EQ(text(80, 0), "");
+    catalogue = "./no such catalogue";
+    EXPECT_EQ(text(80), "ORA-01017: by the server");
+    diagnostics.sqlerrml = -1;
+    EXPECT_EQ(text(80), "ORA-01017");
+    diagnostics.sqlcode = 0;
     EXPECT_EQ(text(80), "");
 }
 
@@ -147,9 +155,30 @@ TEST(MessageTexts, OfSqlstates) {
     };
     for (const auto& c : cases) {
         char area[100];
-        const std::size_t length = SqlstateMessageText(area, sizeof area, 80, c.code);
+        const std::size_t length = SqlstateMessageText(area, sizeof area, 80, "kelpsql.mo", c.code);
         EXPECT_EQ(std::string(area, length), c.text) << c.code;
     }
+}
+
+// Whatever is damaged: nothing beyond the bytes is read, and what is whole is found.
+TEST(MessageTexts, OfADamagedCatalogue) {
+    const std::filesystem::path path = std::filesystem::temp_directory_path() / ("kelpsql." + std::to_string(getpid()));
+    std::ifstream source(std::filesystem::read_symlink("/proc/self/exe").parent_path() / "../share/kelpsql.mo");
+    const std::string whole((std::istreambuf_iterator<char>(source)), {});
+    ASSERT_GT(whole.size(), 1000u);
+    const auto found = [&](const std::string& bytes) {
+        std::ofstream(path, std::ios::binary) << bytes;
+        return std::string(MessageCatalogue(path.string()).Find("ORA-00001"));
+    };
+    EXPECT_EQ(found(whole), "unique constraint violated");
+    for (const std::size_t length : {0u, 3u, 27u, 28u, 40u, 1000u}) EXPECT_EQ(found(whole.substr(0, length)), "") << length;
+    for (std::size_t place = 0; place < 52; place += 4) {
+        std::string damaged = whole;
+        damaged.replace(place, 4, "\xFF\xFF\xFF\xFF");
+        const std::string text = found(damaged);
+        EXPECT_TRUE(text.empty() || whole.find(text) != whole.npos) << place;
+    }
+    std::filesystem::remove(path);
 }
 
 std::string Hex(const void* bytes, std::size_t size) {
