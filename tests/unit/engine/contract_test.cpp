@@ -265,6 +265,18 @@ TEST_P(Contract, ReadOnlyTransactionRefusesChangesAndSeesWhatThereWas) {
     }
 }
 
+TEST_P(SharedContract, SerializableChangeBehindOthersIsRefused) {
+    MakeNumbers();
+    const auto other = Connect();
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::serializable)), 0);
+    EXPECT_EQ(All(), "1;2;3;");
+    EXPECT_EQ(Run(*other, "update t set n = 30 where n = 3"), 0);
+    EXPECT_EQ(Answer(other->Commit()), 0);
+    EXPECT_EQ(Run("update t set n = 31 where n = 3"), 8177);
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(All(), "1;2;30;");
+}
+
 TEST_P(Contract, DefinitionEndsAReadOnlyTransaction) {
     ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_only)), 0);
     EXPECT_EQ(Run("create table t(n integer)"), 0);

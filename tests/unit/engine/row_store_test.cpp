@@ -38,6 +38,21 @@ TEST(RowStore, KeepsEveryKindOfValue) {
     EXPECT_EQ(store.Size(), 0u);
 }
 
+// Rows about as large as what is left of the first block: none reaches into the offsets of rows at the block's end.
+TEST(RowStore, BlocksThatAreJustFull) {
+    for (std::size_t before = 0; before < 8; ++before) {
+        for (std::size_t length = 3700; length < 4100; ++length) {
+            engine::RowStore store;
+            const std::string text(length, 'x');
+            const Datum number[] = {Integer(7)}, last[] = {Text(text)};
+            for (std::size_t row = 0; row < before; ++row) ASSERT_TRUE(store.Add(number).Ok());
+            ASSERT_TRUE(store.Add(last).Ok() && store.Add(last).Ok());
+            for (std::size_t row = 0; row < before; ++row) ASSERT_EQ(At(store, row, 1), "7;");
+            ASSERT_TRUE(At(store, before, 1) == text + ';') << before << " rows before one of " << length;
+        }
+    }
+}
+
 // Sizes about those of blocks; some 100 MB, so that most lie in the file.
 TEST(RowStore, ReadsInAnyOrder) {
     engine::RowStore store;

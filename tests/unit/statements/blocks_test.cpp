@@ -80,6 +80,10 @@ TEST_F(Blocks, RunOnceForEachRow) {
     numbers[0] = 5;
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(RowCount(), 1u) << "the former execute's rows are not counted again";
+    MustRun("delete from t");
+    ASSERT_EQ(Ready(block, {Int(numbers)}), 0);
+    ASSERT_EQ(Execute(3, OCI_DEFAULT, 1), 0);
+    EXPECT_EQ(Rows(), "2,3") << "from the row offset on";
 }
 
 // Counts of elements around the room there is, in and out.
@@ -173,6 +177,18 @@ TEST_F(Blocks, RowsReturnedByTheLastExecution) {
     for (const ub4 execution : {0u, 1u}) {
         ASSERT_EQ(Execute(execution + 1, OCI_DEFAULT, execution), 0);
         EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), execution == 0 ? 2u : 0u);
+    }
+    // The last that succeeds, whatever fails behind it.
+    const struct { std::array<sb4, 3> in; ub4 mode; sb4 answer; ub4 returned; } cases[] = {
+        {{7, 8, 7}, OCI_BATCH_ERRORS, 24381, 1}, {{7, 7, 7}, OCI_BATCH_ERRORS, 24381, 1},
+        {{3, 3, 3}, OCI_BATCH_ERRORS, 24381, 0}, {{7, 7, 8}, OCI_DEFAULT, 1, 1}};
+    for (const auto& c : cases) {
+        MustRun("delete from t where a > 3");
+        std::array<sb4, 3> in = c.in, back = {};
+        ASSERT_EQ(Prepare("insert into t values(:a) returning a into :b"), 0);
+        ASSERT_EQ(BindName("a", Int(in)) + BindName(&(bind = nullptr), "b", Int(back)), 0);
+        EXPECT_EQ(Execute(3, c.mode), c.answer);
+        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), c.returned) << in[0] << in[1] << in[2];
     }
 }
 

@@ -218,6 +218,29 @@ TEST_F(Executing, OpenStatementsAreCounted) {
     EXPECT_EQ(open(), 0u);
 }
 
+// What was compiled and opened on one session is left behind when the statement is executed on another.
+TEST_F(Executing, ThroughAnotherSession) {
+    OCISvcCtx* services[2] = {svc, nullptr};
+    ASSERT_EQ(Logon(&services[1]), OCI_SUCCESS);
+    for (const sb4 number : {1, 2}) {
+        svc = services[number - 1];
+        MustRun("create table t(a number)", "insert into t values(" + std::to_string(number) + ")");
+    }
+    sb4 value = 0;
+    ASSERT_EQ(Query("select a from t", {Int(value)}, 0), 0);
+    for (const sb4 number : {2, 1, 2}) {
+        svc = services[number - 1];
+        ASSERT_EQ(Execute(0), 0);
+        ASSERT_EQ(Fetch(), 0);
+        EXPECT_EQ(value, number);
+        for (OCISvcCtx* service : services) {
+            const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, service, OCI_HTYPE_SVCCTX);
+            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), service == svc ? 1u : 0u);
+        }
+    }
+    EXPECT_EQ(OCILogoff(services[0], err), OCI_SUCCESS);
+}
+
 TEST_F(Executing, OpenQueryOutlivesCommitAndOtherStatements) {
     MustRun("create table t(a number)", "insert into t values(1), (2)");
     OCIStmt* const query = New<OCIStmt>(OCI_HTYPE_STMT);
@@ -258,6 +281,9 @@ TEST_F(Executing, RowIdOfTheLastChange) {
     ASSERT_EQ(Ready("delete from t where rowid = :r", {Text(text)}), 0);
     ASSERT_EQ(Execute(), 0);
     EXPECT_EQ(RowCount(), 1u);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(RowCount(), 0u);
+    EXPECT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, rowid, nullptr, OCI_ATTR_ROWID, err)), 1410) << "it is gone";
     std::strcpy(text, "not a row id");
     EXPECT_EQ(Execute(), 1410);
 }

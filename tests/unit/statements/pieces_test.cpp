@@ -90,6 +90,18 @@ TEST_F(PieceByPiece, LongValueComesInSeveral) {
     EXPECT_EQ(whole, "abcdefgh");
 }
 
+TEST_F(PieceByPiece, ThatJustFits) {
+    const struct { const char* value; ub2 type; ub4 room; const char* piece; sb4 answer; } cases[] = {
+        {"''", SQLT_STR, 1, "", 0}, {"''", SQLT_STR, 0, "", 24307}, {"'a'", SQLT_STR, 2, "a", 0},
+        {"'a'", SQLT_STR, 1, "#", 24307}, {"''", SQLT_CHR, 0, "", 0}, {"'a'", SQLT_CHR, 1, "a", 0}};
+    for (const auto& c : cases) {
+        Begin(std::string("select ") + c.value + " from dual", {InPieces(c.type)});
+        sword rc = 0;
+        EXPECT_EQ(Piece(c.room, rc), c.piece) << c.value << " in " << c.room;
+        EXPECT_EQ(Answer(rc), c.answer) << c.value << " in " << c.room;
+    }
+}
+
 TEST_F(PieceByPiece, OnlySomeTypes) {
     for (const ub2 type : {SQLT_INT, SQLT_FLT, SQLT_VNU, SQLT_DAT, SQLT_VCS, SQLT_CUR}) {
         char area[8];

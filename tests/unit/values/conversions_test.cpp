@@ -69,7 +69,7 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
         {"x'0AFF'", SQLT_CHR, 4, "30414646", 4, 0}, {"x'0AFF'", SQLT_BIN, 3, "0AFF23", 2, 0},
         {"x'0AFF'", SQLT_LBI, 1, "0A", 1, 2}, {"x'0AFF'", SQLT_VBI, 4, "02000AFF", 4, 0},
         {"x'0AFF01'", SQLT_VBI, 4, "02000AFF", 4, 3}, {"'0aF'", SQLT_BIN, 4, "00AF2323", 2, 0},
-       
+        {"''", SQLT_STR, 1, "00", 0, 0},
     };
     for (const auto& c : cases) {
         EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << Shown(c.expression, c.type, c.size);
