@@ -45,6 +45,7 @@ struct Column {
     std::uint8_t precision = 0;   // decimal digits; 0 when not constrained. Of timestamps: digits of the fraction
     std::int8_t scale = 0;        // -127: floating
     bool nullable = true;
+    bool national = false;        // text in the national character set
 };
 
 // What a statement does to the database.
@@ -159,7 +160,14 @@ struct ObjectDescription {
     std::vector<Column> columns;          // of tables and views
     std::string target_schema, target;    // of synonyms
     std::int64_t sequence_start = 1, sequence_step = 1, sequence_least = 1, sequence_most = 0;
+    std::optional<std::int64_t> sequence_cache;    // how many are taken at a time, where the engine tells
+    std::optional<std::int64_t> sequence_mark;     // the last number that was taken, or the first of all
     std::vector<std::string> members;     // of schemas: the names of their objects; of the database: its schemas
+    std::vector<ObjectKind> member_kinds; // of schemas: the kinds in the same order; empty: the engine does not tell
+    std::uint32_t number = 0;             // that the engine knows the object by; 0: none
+    std::uint32_t first_page = 0;         // where a table begins in the database's file; 0: the engine does not tell
+    bool temporary = false;               // of tables: gone with the session
+    bool index_only = false;              // of tables: their rows lie in an index
 };
 
 // ---- Connections

@@ -4,12 +4,13 @@
 #include <span>
 
 #include "date/descriptor.h"
+#include "describe/describe_handle.h"
+#include "describe/parameter.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "handles/plain_objects.h"
 #include "oci.h"
 #include "sessions/service_context.h"
-#include "statements/parameter.h"
 #include "statements/result_set.h"
 #include "values/rowid_descriptor.h"
 
@@ -37,7 +38,7 @@ constexpr Maker kHandles[] = {
     {OCI_HTYPE_STMT, Make<Statement>},
     {OCI_HTYPE_BIND, Make<Bind>},
     {OCI_HTYPE_DEFINE, Make<Define>},
-    {OCI_HTYPE_DESCRIBE, Make<PlainHandle>},
+    {OCI_HTYPE_DESCRIBE, Make<DescribeHandle>},
     {OCI_HTYPE_SERVER, Make<Server>},
     {OCI_HTYPE_SESSION, Make<Session>},
     {OCI_HTYPE_TRANS, Make<TransactionHandle>},

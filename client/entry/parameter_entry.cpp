@@ -1,4 +1,5 @@
-// OCIParamGet: the columns of a statement, and the failed rows of an array execute.
+// OCIParamGet: the columns of a statement, what was described, and the failed rows of an array execute.
+#include "describe/describe_handle.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "statements/statement.h"
@@ -29,6 +30,12 @@ sword OCIParamGet(const dvoid* hndl, ub4 type, OCIError* err, dvoid** paramOut, 
         case OCI_HTYPE_ERROR:
             return Enter<ErrorHandle>(hndl, err,
                                       [&](ErrorHandle& error) { return GetRowFailure(error, pos, paramOut); });
+        case OCI_HTYPE_DESCRIBE:
+            return Enter<DescribeHandle>(
+                hndl, err, [&](DescribeHandle& describe) { return describe.GetParameter(pos, paramOut); });
+        case OCI_DTYPE_PARAM:
+            return Enter<Parameter>(hndl, err,
+                                    [&](Parameter& parameter) { return parameter.GetMember(pos, paramOut); });
         default:
             return Enter<Object>(hndl, err, [&](Object&) { return Error(errors::kIllegalHandleType); });
     }

@@ -17,7 +17,8 @@ enum class Kind : std::uint8_t {
     environment, error, service_context, statement, bind, define, describe, server, session, transaction,
     connection_pool, session_pool, plain_handle, descriptor_array,
     lob, snapshot, result_set, parameter, row_id, datetime, interval, plain_descriptor,
-    string, raw, file, thread_mutex, thread_key, thread_id, thread_handle
+    string, raw, file, thread_mutex, thread_key, thread_id, thread_handle,
+    description
 };
 
 namespace live {

@@ -8,7 +8,7 @@ std::string& Object::KeptText(std::uint32_t attribute) {
     for (auto& [kept, text] : kept_texts_) {
         if (kept == attribute) return text;
     }
-    return kept_texts_.emplace_back(attribute, std::string()).second;
+    return kept_texts_.emplace_front(attribute, std::string()).second;
 }
 
 // While it waits the object may have gone over to another mutex.

@@ -10,6 +10,7 @@
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
+#include <forward_list>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -74,7 +75,7 @@ private:
     in_flight::Epoch born_ = 0;       // its epochs (in_flight.h)
     in_flight::Epoch retired_ = 0;    // once it is
     void* user_memory_ = nullptr;
-    std::vector<std::pair<std::uint32_t, std::string>> kept_texts_;
+    std::forward_list<std::pair<std::uint32_t, std::string>> kept_texts_;    // a text stays where it is
     TypeCode type_;
 };
 

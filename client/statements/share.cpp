@@ -24,8 +24,3 @@ std::shared_ptr<std::recursive_mutex> StatementShare::Serial() const {
     const std::lock_guard lock(mutex_);
     return statement_ ? statement_->Statement::Serial() : nullptr;
 }
-
-std::string_view StatementShare::KeepName(std::string_view name) {
-    const auto found = names_.find(name);
-    return found != names_.end() ? *found : *names_.emplace(name).first;
-}

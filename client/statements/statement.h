@@ -1,7 +1,7 @@
 // Statement handles. A statement is a text with its binds (bound_text.h), defines (defines.h), what the engine compiled
 // of the text, one execution at a time (execution.h), and perhaps an operation that waits for pieces (piece_stream.h).
 // The class puts them together; its parts are in files of their own: statement.cpp (text, binds, defines), execute.cpp,
-// block.cpp, fetch.cpp, pieces.cpp, parameter.cpp, statement_attributes.cpp.
+// block.cpp, fetch.cpp, pieces.cpp, statement_attributes.cpp.
 //
 // Handles that belong to a statement refer to it through what they share (share.h). No call changes another statement,
 // but for the result that a block gives it, and that under its lock.
@@ -16,6 +16,7 @@
 #include <string_view>
 #include <vector>
 
+#include "describe/parameter.h"
 #include "engine/engine.h"
 #include "handles/error_handle.h"
 #include "handles/object.h"
@@ -32,7 +33,6 @@
 #include "statements/share.h"
 #include "statements/targets.h"
 
-class Parameter;
 class ServiceContext;
 
 class Statement : public Object, public LinkUser {
@@ -185,5 +185,5 @@ private:
     PieceStream pieces_;
     engine::ArrayOutcome outcome_;    // of the execute; of one in pieces, what its iterations did so far
     PollingDriver driver_;
-    std::vector<Parameter*> parameters_;    // by position - 1, as handed out; perhaps freed since
+    Parameters parameters_;    // by position - 1
 };

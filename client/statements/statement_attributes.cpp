@@ -1,4 +1,4 @@
-// Attributes of statements.
+// Attributes of statements, and the parameters of their select lists.
 #include "handles/attributes.h"
 #include "handles/environment.h"
 #include "handles/errors.h"
@@ -102,3 +102,15 @@ constexpr AttributeRow kRows[] = {
 }  // namespace
 
 std::span<const AttributeRow> Statement::Attributes() const { return kRows; }
+
+Status Statement::GetParameter(ub4 position, dvoid** out) {
+    const std::vector<engine::Column>* columns = Columns();
+    if (!columns || position == 0 || position > columns->size()) return Error(errors::kNoParameter);
+    if (!out) return Error(errors::kNullArgument);
+    const auto column = describe::SelectedColumn((*columns)[position - 1], position);
+    dvoid* const parameter = &parameters_.At(position - 1, *this, Share(), column);
+    columns = Columns();    // a memory function may have prepared anew
+    if (!columns || position > columns->size()) return Error(errors::kNoParameter);
+    *out = parameter;
+    return {};
+}

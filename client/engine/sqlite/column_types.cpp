@@ -23,6 +23,7 @@ struct TypeRow {
     std::uint32_t size;          // when nothing is in parentheses
     std::uint8_t precision;
     std::int8_t scale;
+    bool national = false;       // in the national character set
 };
 
 constexpr std::int8_t kFloating = -127;
@@ -58,15 +59,15 @@ constexpr TypeRow kTypes[] = {
     {"binary_double", SQLT_IBDOUBLE, Measure::none, 8, 0, 0},
     {"varchar2", SQLT_CHR, Measure::size, 0, 0, 0},
     {"varchar", SQLT_CHR, Measure::size, 0, 0, 0},
-    {"nvarchar2", SQLT_CHR, Measure::characters, 0, 0, 0},
-    {"nvarchar", SQLT_CHR, Measure::characters, 0, 0, 0},
+    {"nvarchar2", SQLT_CHR, Measure::characters, 0, 0, 0, true},
+    {"nvarchar", SQLT_CHR, Measure::characters, 0, 0, 0, true},
     {"char varying", SQLT_CHR, Measure::size, 0, 0, 0},
     {"character varying", SQLT_CHR, Measure::size, 0, 0, 0},
     {"varying character", SQLT_CHR, Measure::size, 0, 0, 0},
     {"text", SQLT_CHR, Measure::size, 0, 0, 0},
     {"string", SQLT_CHR, Measure::size, 0, 0, 0},
-    {"nchar", SQLT_AFC, Measure::characters, 1, 0, 0},
-    {"native character", SQLT_AFC, Measure::characters, 1, 0, 0},
+    {"nchar", SQLT_AFC, Measure::characters, 1, 0, 0, true},
+    {"native character", SQLT_AFC, Measure::characters, 1, 0, 0, true},
     {"character", SQLT_AFC, Measure::size, 1, 0, 0},
     {"char", SQLT_AFC, Measure::size, 1, 0, 0},
     {"raw", SQLT_BIN, Measure::size, 0, 0, 0},
@@ -83,7 +84,7 @@ constexpr TypeRow kTypes[] = {
     {"timestamp", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
     {"time", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
     {"clob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0},
-    {"nclob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0},
+    {"nclob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0, true},
     {"dbclob", SQLT_DBCLOB, Measure::none, kLocatorSize, 0, 0},
     {"blob", SQLT_BLOB, Measure::none, kLocatorSize, 0, 0},
     {"bfile", SQLT_FILE, Measure::none, kLocatorSize, 0, 0},
@@ -173,6 +174,7 @@ bool ReadDeclaredType(std::string_view declared, Column& column) {
     column.size = row->size;
     column.precision = row->precision;
     column.scale = row->scale;
+    column.national = row->national;
     column.characters = 0;
     Apply(row->measure == Measure::size && counts_characters ? Measure::characters : row->measure, normal, column);
     return true;

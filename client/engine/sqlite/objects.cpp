@@ -29,8 +29,9 @@ std::string Quoted(std::string_view name) {
     return quoted += '`';
 }
 
-// The texts of the first column.
-Status Texts(sqlite3* database, const std::string& sql, std::string_view bound, std::vector<std::string>& texts) {
+// Hands each row of a query to `take`.
+template <class Take>
+Status Rows(sqlite3* database, const std::string& sql, std::string_view bound, Take take) {
     sqlite3_stmt* compiled = nullptr;
     int code = sqlite3_prepare_v2(database, sql.c_str(), static_cast<int>(sql.size()), &compiled, nullptr);
     const StatementHandle statement(compiled);
@@ -38,12 +39,18 @@ Status Texts(sqlite3* database, const std::string& sql, std::string_view bound, 
         code = sqlite3_bind_text(compiled, 1, bound.data(), static_cast<int>(bound.size()), SQLITE_STATIC);
     }
     if (code == SQLITE_OK) code = sqlite3_step(compiled);
-    for (; code == SQLITE_ROW; code = sqlite3_step(compiled)) {
-        const auto* text = reinterpret_cast<const char*>(sqlite3_column_text(compiled, 0));
-        if (!text) throw std::bad_alloc();
-        texts.emplace_back(text);
-    }
+    for (; code == SQLITE_ROW; code = sqlite3_step(compiled)) take(compiled);
     return code == SQLITE_DONE ? Status() : Failure(database, code);
+}
+
+std::string TextAt(sqlite3_stmt* row, int column) {
+    const auto* text = reinterpret_cast<const char*>(sqlite3_column_text(row, column));
+    return text ? text : throw std::bad_alloc();
+}
+
+// The texts of the first column.
+Status Texts(sqlite3* database, const std::string& sql, std::string_view bound, std::vector<std::string>& texts) {
+    return Rows(database, sql, bound, [&texts](sqlite3_stmt* row) { texts.push_back(TextAt(row, 0)); });
 }
 
 // In the order in which SQLite looks for a name.
@@ -81,7 +88,15 @@ Status DescribeTable(sqlite3* database, const Found& found, const std::string& n
     object.kind = found.type == "view" ? ObjectKind::view : ObjectKind::table;
     object.schema = Upper(found.schema);
     object.name = Upper(name);
-    return {};
+    object.temporary = found.schema == "temp";
+    const auto take = [&object](sqlite3_stmt* row) {
+        object.number = static_cast<std::uint32_t>(sqlite3_column_int64(row, 0));
+        object.first_page = static_cast<std::uint32_t>(sqlite3_column_int64(row, 1));
+        object.index_only = sqlite3_column_int(row, 2) != 0;
+    };
+    return Rows(database, "select s.rowid, s.rootpage, l.wr from " + Quoted(found.schema) + ".sqlite_schema s, "
+                "pragma_table_list l where s.type in ('table', 'view') and s.name = ?1 collate nocase and l.name = s.name"
+                " and l.schema = '" + found.schema + "'", name, take);
 }
 
 Status DescribeSchema(sqlite3* database, const std::string& name, ObjectDescription& object) {
@@ -90,9 +105,13 @@ Status DescribeSchema(sqlite3* database, const std::string& name, ObjectDescript
     if (status.Failed()) return status;
     for (const std::string& schema : schemas) {
         if (sqlite3_stricmp(schema.c_str(), name.c_str()) != 0) continue;
-        status = Texts(database, "select upper(name) from " + Quoted(schema) + ".sqlite_schema where type in ('table', "
-                       "'view') and name not like 'sqlite\\_%' escape '\\' and name <> 'kelp_accounts' order by 1",
-                       {}, object.members);
+        const auto take = [&object](sqlite3_stmt* row) {
+            object.members.push_back(TextAt(row, 0));
+            object.member_kinds.push_back(TextAt(row, 1) == "view" ? ObjectKind::view : ObjectKind::table);
+        };
+        status = Rows(database, "select upper(name), type from " + Quoted(schema) + ".sqlite_schema where type in ('table', "
+                      "'view') and name not like 'sqlite\\_%' escape '\\' and name <> 'kelp_accounts' order by 1",
+                      {}, take);
         object.kind = ObjectKind::schema;
         object.name = Upper(schema);
         return status;
