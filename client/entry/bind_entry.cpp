@@ -50,6 +50,17 @@ sword OCIDefineByPos(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 pos, dvo
     });
 }
 
+sword OCIBindDynamic(OCIBind* b, OCIError* err, dvoid* inCtx, OCICallbackInBind in, dvoid* outCtx,
+                     OCICallbackOutBind out) {
+    return Enter<Bind>(b, err, [&](Bind& bind) { return bind.area->SetCallbacks({in, inCtx, out, nullptr, outCtx}); });
+}
+
+sword OCIDefineDynamic(OCIDefine* d, OCIError* err, dvoid* ctx, OCICallbackDefine cb) {
+    return Enter<Define>(d, err, [&](Define& define) {
+        return define.area->SetCallbacks({nullptr, nullptr, nullptr, cb, ctx});
+    });
+}
+
 sword OCIBindArrayOfStruct(OCIBind* b, OCIError* err, ub4 valueSkip, ub4 indSkip, ub4 lenSkip, ub4 rcodeSkip) {
     return SetSteps<Bind>(b, err, valueSkip, indSkip, lenSkip, rcodeSkip);
 }

@@ -61,7 +61,12 @@ sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept 
     T* target = Live<T>(object);
     if (!target) return OCI_INVALID_HANDLE;
     const SerialLock lock(*target);
-    return Guard(error->list, [&] { return body(*target, *error); });
+    return Guard(error->list, [&] {
+        if constexpr (requires { target->Admit(); }) {
+            if (Status status = target->Admit(); !status.Ok()) return status;
+        }
+        return body(*target, *error);
+    });
 }
 
 // The same for bodies that answer with a status alone: body(T&).

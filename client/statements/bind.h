@@ -2,8 +2,18 @@
 #pragma once
 
 #include <string>
+#include <vector>
 
 #include "statements/data_area.h"
+
+// A value in the application's form.
+struct WholeValue {
+    std::string bytes;
+    bool is_null = true;
+    bool is_given = false;    // by the step that runs
+
+    void Forget() noexcept { bytes.clear(), is_null = true; }
+};
 
 struct BindArea : DataArea {
     using DataArea::DataArea;
@@ -15,9 +25,10 @@ struct BindArea : DataArea {
     ub4* current_elements = nullptr;    // of a table
     std::uint32_t rows_returned = 0;    // by the last execution of a statement that returns values
 
-    // A value that came in pieces, of the iteration that is being collected.
-    std::string collected;
-    bool collected_null = false;
+    // Values in pieces, of the iteration that is under way. In: one, or those of a table; of a block's variable what it
+    // holds. Out: what the iteration gives back, one a row; in a block what a step gives.
+    std::vector<WholeValue> in;
+    std::vector<WholeValue> out;
 };
 
 class Bind final : public AreaHandle<BindArea> {

@@ -8,10 +8,10 @@
 namespace {
 
 // What the pieces made: text of a terminated type ends at the zero.
-int LoadCollected(BindArea& bind, engine::Datum& value) {
+int LoadCollected(BindArea& bind, std::uint32_t element, engine::Datum& value) {
     value.kind = engine::Kind::null;
-    if (bind.collected_null) return 0;
-    std::string_view data = bind.collected;
+    if (element >= bind.in.size() || bind.in[element].is_null) return 0;
+    std::string_view data = bind.in[element].bytes;
     if (bind.Type()->family != values::Family::text) return values::FromWholeBytes(data, bind.workspace, value);
     if (bind.Type()->code == SQLT_STR && !bind.workspace.utf16) data = data.substr(0, data.find('\0'));
     return values::FromWholeText(data, bind.workspace, value);
@@ -78,7 +78,7 @@ int BindRows::Load(const Slot& slot, std::uint32_t row, engine::Datum& value) co
     BindArea& bind = *slot.bind;
     const std::uint32_t element = bind.IsTable() ? table_element : row;
     const int error = bind.InPieces()
-                          ? LoadCollected(bind, value)
+                          ? LoadCollected(bind, bind.IsTable() ? table_element : 0, value)
                           : values::Load(bind.elements, element, bind.Type()->in, bind.workspace, value);
     if (error != 0 || !slot.is_row_id || value.kind != engine::Kind::text) return error;
     return values::RowIdFromText(bind.workspace, value);

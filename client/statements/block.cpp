@@ -176,6 +176,7 @@ Status Statement::Change(Compiled& compiled, const sql::Step& step, ub4 row, ub4
     const engine::ArrayRun run{row, row + 1, false, returns ? &targets : nullptr};
     if (Status status = compiled.query->ExecuteArray(compiled.rows, run, outcome); !status.Ok()) return status;
     if (!outcome.failures.empty()) return std::move(outcome.failures.front().status);
+    targets.Settle();
     if (returns) SetReturned(step, targets.Rows());
     return {};
 }
@@ -188,6 +189,7 @@ Status Statement::SelectInto(Compiled& compiled, Targets& targets, ub4 row) {
     Status status = query.Fetch(targets, 2, more);
     query.Close();
     if (status.Ok() && targets.Rows() == 0) status = Error(errors::kNoRows);
+    if (status.Ok()) targets.Settle();
     return status;
 }
 
@@ -201,6 +203,7 @@ Status Statement::SelectIntoTables(Compiled& compiled, const sql::Step& step, ub
     Status status;
     for (bool more = true; more && status.Ok();) status = query.Fetch(targets, kBatch, more);
     query.Close();
+    targets.Settle();
     for (const std::uint32_t target : step.targets)
         if (text_.IsBound(target) && text_.At(target)->IsTable()) *text_.At(target)->current_elements = targets.Rows();
     return status;
@@ -240,7 +243,7 @@ Status Statement::OpenResult(Compiled& compiled, const sql::Step& step, ub4 row)
     Statement* target = ResultTarget(place);
     void* pointer;
     std::memcpy(&pointer, place, sizeof pointer);
-    if ((!target && pointer) || target == this) return Error(errors::kBadResultSet);
+    if ((!target && pointer) || target == this || (target && target->pieces_.Asks())) return Error(errors::kBadResultSet);
     if (Status status = compiled.query->Open(compiled.rows, {row, false, prefetch_rows}); !status.Ok()) return status;
     std::unique_ptr<engine::Query> query = std::move(compiled.query);
     if (!target) target = Create<Statement>(Env(), OCI_HTYPE_STMT, 0);

@@ -102,6 +102,7 @@ Status DataArea::Assign(const AreaArguments& arguments, bool in_pieces) {
     if (error != 0) return Error(error);
     type_ = type;
     in_pieces_ = in_pieces;
+    callbacks_ = {};
     piece = {};
     elements = {};
     elements.values = static_cast<char*>(arguments.value);
@@ -110,6 +111,12 @@ Status DataArea::Assign(const AreaArguments& arguments, bool in_pieces) {
     elements.indicators = static_cast<char*>(arguments.indicators);
     elements.lengths = reinterpret_cast<char*>(arguments.lengths);
     elements.codes = reinterpret_cast<char*>(arguments.codes);
+    return {};
+}
+
+Status DataArea::SetCallbacks(const Callbacks& callbacks) {
+    if (!in_pieces_) return Error(errors::kBadContext);
+    callbacks_ = callbacks;
     return {};
 }
 

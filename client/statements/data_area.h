@@ -38,6 +38,19 @@ struct PieceBuffer {
     bool is_set = false;
 };
 
+// What asks the application for the places of pieces; functions that it did not give are null.
+struct Callbacks {
+    OCICallbackInBind in = nullptr;
+    void* in_context = nullptr;
+    OCICallbackOutBind out = nullptr;
+    OCICallbackDefine define = nullptr;
+    void* out_context = nullptr;
+
+    // Whether values are given or taken by callback, rather than by polling.
+    [[nodiscard]] bool Any() const { return in || out || define; }
+    [[nodiscard]] bool Serve(bool comes_out) const { return comes_out ? out || define : in != nullptr; }
+};
+
 class DataArea {
 public:
     DataArea(Object& handle, TypeCode handle_type);
@@ -46,6 +59,8 @@ public:
     Status Assign(const AreaArguments& arguments, bool in_pieces);
     // Steps of an array of structures, in bytes.
     void SetSteps(ub4 value, ub4 indicator, ub4 length, ub4 code);
+    // 24305 for an area that takes no pieces.
+    Status SetCallbacks(const Callbacks& callbacks);
     // Whether the application could still hand the handle in.
     [[nodiscard]] bool HasHandle() const noexcept { return live::KindOf(workspace.holder) != Kind::none; }
     [[nodiscard]] Object* Handle() const noexcept { return Live<Object>(workspace.holder); }
@@ -61,6 +76,7 @@ public:
 
     [[nodiscard]] const values::ExternalType* Type() const { return type_; }
     [[nodiscard]] bool InPieces() const { return in_pieces_; }
+    [[nodiscard]] const Callbacks& AsksBy() const { return callbacks_; }
     Status UseCharacterSet(std::uint16_t id);
 
     values::Elements elements;
@@ -79,6 +95,7 @@ private:
     const TypeCode handle_type_;
     const values::ExternalType* type_ = nullptr;
     bool in_pieces_ = false;
+    Callbacks callbacks_;
     mutable std::mutex owner_mutex_;
     std::shared_ptr<StatementShare> owner_;
 };

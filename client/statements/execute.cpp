@@ -55,6 +55,7 @@ Status Statement::Execute(const ExecuteTarget& target, ErrorHandle& error, const
 }
 
 Status Statement::ExecuteNow(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
+    if (Status status = Admit(); !status.Ok()) return status;
     const PieceStream::Use wants = pieces_.Wants();
     if (wants == PieceStream::Use::execute) return ContinueExecute(error);
     if (wants == PieceStream::Use::fetch_by_execute) {

@@ -30,6 +30,8 @@ std::size_t PieceLength(const DataArea& area, std::string_view rest, std::size_t
 // Moves the next part of `rest` into the buffer; terminated types get a zero that is not counted.
 int Move(const DataArea& area, const PieceBuffer& piece, std::string_view& rest) {
     const std::size_t zero = area.Type()->code != SQLT_STR ? 0 : area.workspace.utf16 ? 2 : 1;
+    if (!piece.length) return errors::kBadLength;
+    if (!piece.buffer) return errors::kBadBuffer;
     const std::size_t room = *piece.length;
     if (room < zero) return errors::kBadLength;
     const std::size_t taken = PieceLength(area, rest, room - zero);
@@ -49,19 +51,6 @@ std::int16_t CutIndicator(std::size_t whole) {
 
 }  // namespace
 
-bool SaysNull(const PieceBuffer& piece) {
-    std::int16_t indicator = 0;
-    if (piece.indicator) std::memcpy(&indicator, piece.indicator, sizeof indicator);
-    return indicator == values::kNullIndicator;
-}
-
-Status PollingDriver::Supply(WantedPiece& wanted) {
-    if (std::exchange(wanted.area->piece.is_set, false)) return {};
-    if (wanted.asked) return Error(errors::kNoBuffer);
-    wanted.asked = true;
-    return NeedData(wanted.out ? errors::kWantsBuffer : errors::kWantsPiece);
-}
-
 void OwnRow::Keep(std::span<const engine::Datum> values) {
     constexpr std::size_t kWord = sizeof(std::uint64_t);
     const auto words = [](const engine::Datum& value) {
@@ -80,68 +69,228 @@ void OwnRow::Keep(std::span<const engine::Datum> values) {
     }
 }
 
+bool PieceStream::AllLiving() const noexcept {
+    return std::all_of(ins_.begin(), ins_.end(), [](const auto& bind) { return bind->HasHandle(); });
+}
+
 void PieceStream::EndUnlessLiving() noexcept {
     const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
-    const bool living = (!wanted_.area || wanted_.area->HasHandle()) &&
-                        std::all_of(binds_.begin(), binds_.end(), [](const auto& bind) { return bind->HasHandle(); });
-    if (living) seen_ = erased;
+    if ((!wanted_.area || wanted_.area->HasHandle()) && AllLiving()) seen_ = erased;
     else End();
 }
 
 void PieceStream::End() noexcept {
     use_ = Use::none;
     wanted_ = {};
-    binds_.clear();
+    ins_.clear();
+    outs_.clear();
     bind_ = 0;
 }
 
-// ---- Going in
+Status PieceStream::Fail(int error) noexcept {
+    End();
+    return Error(error);
+}
 
-void PieceStream::StartExecute(const BoundText& text, const ExecuteArguments& arguments) {
+Status PieceStream::SetPlace(DataArea& area, const PieceBuffer& place) {
+    const bool waits = Wants() != Use::none && !asks_ && wanted_.area == &area && !wanted_.ByCallback();
+    if (!waits || place.piece > OCI_LAST_PIECE) return Error(errors::kIllegalOperation);
+    const bool goes_on = place.piece == OCI_NEXT_PIECE || place.piece == OCI_LAST_PIECE;
+    if (!wanted_.out && goes_on != wanted_.continued) return Error(errors::kIllegalOperation);
+    const bool null_in = !wanted_.out && SaysNull(place);
+    if (!null_in && !place.length) return Error(errors::kBadLength);
+    if (!null_in && !place.buffer) return Error(errors::kBadBuffer);
+    area.piece = place;
+    area.piece.is_set = true;
+    return {};
+}
+
+// Has the driver put the place of the piece into its area. A polled piece stays wanted whatever is answered; the failure
+// of a callback ends the operation. No area is wanted any more when its handle was freed while its value came out.
+Status PieceStream::Ask(PieceDriver& driver) {
+    if (!wanted_.ByCallback()) return driver.Supply(wanted_);
+    Status status;
+    {
+        struct Asking {
+            explicit Asking(bool& asks) : asks_(asks) { asks_ = true; }
+            ~Asking() { asks_ = false; }
+            bool& asks_;
+        } const asking(asks_);
+        status = driver.Supply(wanted_);
+    }
+    if (use_ == Use::none) return Error(errors::kNotConnected);    // the session went
+    if (!status.Ok()) {
+        End();
+        return status;
+    }
+    const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
+    if (erased == seen_) return {};
+    if (live::KindOf(statement_) == Kind::none) return Fail(errors::kIllegalOperation);
+    if (!wanted_.out && !AllLiving()) return Fail(errors::kNotAllBound);
+    if (wanted_.area->HasHandle()) seen_ = erased;
+    else wanted_.area = nullptr;
+    return {};
+}
+
+// ---- Binds
+
+namespace {
+
+using Binds = std::vector<std::shared_ptr<BindArea>>;
+
+void AddOnce(Binds& binds, const std::shared_ptr<BindArea>& bind) {
+    if (std::find(binds.begin(), binds.end(), bind) == binds.end()) binds.push_back(bind);
+}
+
+bool IsTarget(const sql::StatementText& text, std::size_t placeholder) {
+    return std::any_of(text.steps.begin(), text.steps.end(), [placeholder](const sql::Step& step) {
+        return std::find(step.targets.begin(), step.targets.end(), placeholder) != step.targets.end();
+    });
+}
+
+// A callback serves one direction, and there is one for the other.
+bool LacksCallback(const Binds& binds, bool comes_out) {
+    return std::any_of(binds.begin(), binds.end(), [comes_out](const auto& bind) {
+        return bind->AsksBy().Any() && !bind->AsksBy().Serve(comes_out);
+    });
+}
+
+ub4 ElementsOf(const BindArea& bind) { return bind.IsTable() ? *bind.current_elements : 1; }
+
+}  // namespace
+
+// What is only given back is not asked for, unless there is a callback to ask; what that gives is not looked at.
+Status PieceStream::StartExecute(const BoundText& text, const ExecuteArguments& arguments) {
     End();
     seen_ = live::erased_objects.load(std::memory_order_acquire);
     for (std::size_t placeholder = 0; placeholder < text.Count(); ++placeholder) {
         const std::shared_ptr<BindArea>& bind = text.At(placeholder);
         if (!bind || !bind->InPieces() || !bind->HasHandle()) continue;
-        if (std::find(binds_.begin(), binds_.end(), bind) == binds_.end()) binds_.push_back(bind);
+        const bool is_target = IsTarget(text.Scanned(), placeholder);
+        if (is_target) AddOnce(outs_, bind);
+        if (!is_target || bind->AsksBy().in) AddOnce(ins_, bind);
     }
+    if (LacksCallback(ins_, false) || LacksCallback(outs_, true)) return Fail(errors::kNoCallback);
     use_ = Use::execute;
+    warned_ = false;
     arguments_ = arguments;
     wanted_.iteration = arguments.first;
-    for (const auto& bind : binds_) bind->collected_null = false, bind->collected.clear();
-    wanted_.area = binds_[0].get();
-    wanted_.area->piece = {};
+    for (const auto& bind : ins_) bind->piece = {};
+    ForgetValues();
+    return {};
+}
+
+void PieceStream::ForgetValues() noexcept {
+    for (const Binds* binds : {&ins_, &outs_})
+        for (const auto& bind : *binds)
+            for (WholeValue& whole : bind->in) whole.Forget();
+    ForgetReturned();
+}
+
+void PieceStream::ForgetReturned() noexcept {
+    for (const auto& bind : outs_) bind->out.clear();
 }
 
 Status PieceStream::Collect(PieceDriver& driver) {
-    while (bind_ < binds_.size()) {
-        BindArea& bind = *binds_[bind_];
-        wanted_.area = &bind;
-        wanted_.out = false;
-        if (Status status = driver.Supply(wanted_); !status.Ok()) return status;
-        const PieceBuffer& place = bind.piece;
-        const bool is_null = SaysNull(place);
-        if (!is_null) bind.collected.append(static_cast<const char*>(place.buffer), *place.length);
-        bind.collected_null = is_null;
-        if (place.code) *place.code = 0;
-        wanted_.asked = false;
-        wanted_.continued = !is_null && place.piece != OCI_ONE_PIECE && place.piece != OCI_LAST_PIECE;
-        if (!wanted_.continued) ++bind_;
+    for (; bind_ < ins_.size(); ++bind_) {
+        BindArea& bind = *ins_[bind_];
+        const ub4 elements = ElementsOf(bind);
+        if (bind.IsTable() && elements > bind.most_elements) return Fail(errors::kBadTableLength);
+        if (bind.in.size() < elements) bind.in.resize(elements);
+        while (wanted_.index < elements)
+            if (Status status = CollectPiece(bind, driver); !status.Ok()) return status;
+        wanted_.index = 0;
     }
+    wanted_.area = nullptr;
     return {};
+}
+
+Status PieceStream::CollectPiece(BindArea& bind, PieceDriver& driver) {
+    wanted_.area = &bind;
+    const bool by_callback = wanted_.ByCallback();
+    if (Status status = Ask(driver); !status.Ok()) return status;
+    if (const int error = AppendPiece(bind.in[wanted_.index], bind.piece, by_callback)) return Fail(error);
+    wanted_.asked = false;
+    if (!wanted_.continued) ++wanted_.index;
+    return {};
+}
+
+// A callback that goes by the iteration alone gives the same piece again when it is asked for the next one: that was all.
+int PieceStream::AppendPiece(WholeValue& whole, const PieceBuffer& place, bool by_callback) {
+    constexpr std::size_t kLongest = 0x7FFFFFFF;
+    const bool begins = !wanted_.continued;
+    const bool is_null = SaysNull(place) || (by_callback && !place.buffer && *place.length == 0);
+    if (place.code) std::memset(place.code, 0, sizeof *place.code);
+    whole.is_null = is_null;
+    wanted_.continued = false;
+    if (is_null) return 0;
+    if (!place.buffer) return errors::kBadBuffer;
+    if (place.piece > OCI_LAST_PIECE) return errors::kIllegalOperation;
+    const std::string_view piece(static_cast<const char*>(place.buffer), *place.length);
+    if (!begins && by_callback && std::exchange(begun_with_, ub1{OCI_LAST_PIECE}) == place.piece &&
+        place.piece != OCI_LAST_PIECE && piece == whole.bytes)
+        return 0;
+    const bool begins_again = place.piece == OCI_ONE_PIECE || place.piece == OCI_FIRST_PIECE;
+    if (!begins && begins_again) return errors::kIllegalOperation;
+    if (piece.size() > kLongest - whole.bytes.size()) return errors::kPiecesTooLong;
+    whole.bytes.append(piece);
+    if (begins) begun_with_ = place.piece;
+    wanted_.continued = place.piece != OCI_ONE_PIECE && place.piece != OCI_LAST_PIECE;
+    return 0;
 }
 
 void PieceStream::NextIteration() noexcept {
     ++wanted_.iteration;
+    wanted_.out = false;
+    wanted_.index = 0;
     bind_ = 0;
-    wanted_.area = binds_[0].get();
-    for (const auto& bind : binds_) bind->collected_null = false, bind->collected.clear();
+    ForgetValues();
 }
 
-// ---- Coming out
+void PieceStream::StartDelivery(bool is_block) {
+    wanted_.out = true;
+    wanted_.index = 0;
+    bind_ = 0;
+    returned_ = 0;
+    for (const auto& bind : outs_) {
+        if (is_block) {
+            bind->in.resize(ElementsOf(*bind));
+            bind->out.swap(bind->in);
+        }
+        returned_ = std::max(returned_, bind->out.size());
+    }
+}
+
+// Row by row, and in each by order of the placeholders. False when there are no more.
+bool PieceStream::NextReturned() {
+    for (; wanted_.index < returned_; ++wanted_.index, bind_ = 0) {
+        while (bind_ < outs_.size()) {
+            BindArea& bind = *outs_[bind_++];
+            if (wanted_.index >= bind.out.size() || !bind.HasHandle()) continue;
+            const WholeValue& whole = bind.out[wanted_.index];
+            is_null_ = whole.is_null;
+            rest_ = whole.bytes;
+            whole_ = rest_.size();
+            bind.piece = {};
+            wanted_.area = &bind;
+            wanted_.continued = wanted_.asked = false;
+            return true;
+        }
+    }
+    return false;
+}
+
+Status PieceStream::Deliver(PieceDriver& driver) {
+    while (wanted_.area || NextReturned())
+        if (Status status = HandPieces(driver); !status.Ok()) return status;
+    return {};
+}
+
+// ---- Rows
 
 void PieceStream::StartFetch(ub4 end, bool by_execute, ub4 mode) noexcept {
     End();
+    warned_ = false;
     use_ = by_execute ? Use::fetch_by_execute : Use::fetch;
     arguments_ = {end, 0, mode};
     wanted_.out = true;
@@ -161,7 +310,7 @@ int PieceStream::NextValue(const Defines& defines) {
     const auto takes_part = [&](const DataArea& area) { return area.InPieces() && (all_live || area.HasHandle()); };
     while (define_ < all.size() && !takes_part(*all[define_].area)) ++define_;
     if (define_ == all.size()) return 0;
-    const Defines::Active& active = all[define_++];
+    const Defines::Active& active = all[define_];
     DataArea& area = *active.area;
     const engine::Datum& value = row_[active.column];
     is_null_ = value.kind == engine::Kind::null;
@@ -171,6 +320,7 @@ int PieceStream::NextValue(const Defines& defines) {
     if (error == 0 && area.Type()->family == values::Family::text)
         error = values::ToApplication(rest_, area.workspace, rest_);
     if (error != 0) return error;
+    ++define_;    // memory that is short leaves the value to the next call
     whole_ = rest_.size();
     area.piece.is_set = false;
     wanted_.area = &area;
@@ -185,11 +335,12 @@ int PieceStream::TakePiece(bool& value_ends) {
     const ub4 row = wanted_.iteration;
     value_ends = true;
     if (is_null_) {
-        *place.length = 0;
+        if (place.length) *place.length = 0;
         TellCode(area, row, place, errors::kNullFetched);
         return TellIndicator(area, row, place, values::kNullIndicator) ? 0 : errors::kNullFetched;
     }
     if (const int error = Move(area, place, rest_)) {
+        if (error == errors::kBadLength && place.length && wanted_.continued && wanted_.ByCallback()) return EndCut(place);
         value_ends = false;
         return error;
     }
@@ -200,23 +351,40 @@ int PieceStream::TakePiece(bool& value_ends) {
     return 0;
 }
 
-Status PieceStream::HandOut(const Defines& defines, PieceDriver& driver) {
-    for (;;) {
-        if (!wanted_.area) {
-            if (const int error = NextValue(defines)) {
-                End();
-                return Error(error);
-            }
-            if (!wanted_.area) return {};
-        }
-        if (Status status = driver.Supply(wanted_); !status.Ok()) return status;
+// A callback has no room for the rest of the value: as if its area were too small.
+int PieceStream::EndCut(const PieceBuffer& place) {
+    const DataArea& area = *wanted_.area;
+    *place.length = 0;
+    TellCode(area, wanted_.iteration, place, errors::kTruncated);
+    TellIndicator(area, wanted_.iteration, place, CutIndicator(whole_));
+    warned_ = true;
+    return place.code || area.elements.codes ? 0 : errors::kTruncated;
+}
+
+// The value at hand, until it is taken.
+Status PieceStream::HandPieces(PieceDriver& driver) {
+    while (wanted_.area) {
+        const bool by_callback = wanted_.ByCallback();
+        if (Status status = Ask(driver); !status.Ok()) return status;
+        if (!wanted_.area) break;
         bool value_ends = false;
         if (const int error = TakePiece(value_ends)) {
-            if (value_ends) End();    // else another buffer may do
+            if (value_ends || by_callback) End();    // else another buffer may do
             return Error(error);
         }
         if (value_ends) wanted_.area = nullptr;
         wanted_.continued = !value_ends;
         wanted_.asked = false;
+    }
+    return {};
+}
+
+Status PieceStream::HandOut(const Defines& defines, PieceDriver& driver) {
+    for (;;) {
+        if (!wanted_.area) {
+            if (const int error = NextValue(defines)) return Fail(error);
+            if (!wanted_.area) return {};
+        }
+        if (Status status = HandPieces(driver); !status.Ok()) return status;
     }
 }

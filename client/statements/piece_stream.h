@@ -1,11 +1,13 @@
-// Values in pieces. A stream knows which piece is wanted next and what of the values is there; a driver gets the place
-// of each piece from the application, in its own way. The one there is waits for the application: the call answers
-// OCI_NEED_DATA, the application says where the piece is and makes the same call again. One that asks the application by
-// a callback only has to supply the place at once.
+// Values in pieces. A stream knows which piece is wanted next and what of the values is there; a driver
+// (piece_drivers.h) gets the place of each piece from the application, by polling or by callback.
 //
 // Going in, the application decides with ONE or LAST that a value is complete; coming out, a value goes on until it is
-// taken whole or the application says LAST. The row whose values go out is the stream's own copy: whatever becomes of
-// the query meanwhile, its bytes stay.
+// taken whole or the application says LAST. The row whose values go out is the stream's own copy, as are the values
+// that an iteration returns: whatever becomes of the query meanwhile, their bytes stay.
+//
+// While a callback runs, the statement takes no other call (Asks). What the callback takes away besides ends the
+// operation: the statement's handle, its session, a bind. A define or bind that is freed before its value comes out, or
+// while it does, is passed over.
 //
 // The defines stay as they were activated while a stream is under way: whoever changes them ends it first.
 //
@@ -21,33 +23,7 @@
 #include "statements/bound_text.h"
 #include "statements/defines.h"
 #include "statements/execution.h"
-
-// The piece that is wanted next.
-struct WantedPiece {
-    DataArea* area = nullptr; // one of the stream's binds or of the active defines; null while no value is at hand
-    bool out = false;         // to the application
-    ub4 iteration = 0;        // or row, from 0
-    bool continued = false;   // the value has begun
-    bool asked = false;       // the application knows
-};
-
-// Where pieces lie.
-class PieceDriver {
-public:
-    virtual ~PieceDriver() = default;
-    // Puts the place of the piece into its area. What is not Ok ends the call that is under way: OCI_NEED_DATA until it
-    // is made again, anything else as its error; the piece stays wanted.
-    virtual Status Supply(WantedPiece& wanted) = 0;
-};
-
-// Takes the places that OCIStmtSetPieceInfo gave.
-class PollingDriver final : public PieceDriver {
-public:
-    Status Supply(WantedPiece& wanted) override;
-};
-
-// Whether the application says that the value is null.
-bool SaysNull(const PieceBuffer& piece);
+#include "statements/piece_drivers.h"
 
 // A row that is kept.
 class OwnRow {
@@ -62,6 +38,8 @@ private:
 
 class PieceStream {
 public:
+    explicit PieceStream(const void* statement) : statement_(statement) {}
+
     enum class Use : std::uint8_t { none, execute, fetch, fetch_by_execute };
 
     // What the stream waits for. None when the handle of the wanted piece, or a bind that takes part, is freed: the
@@ -73,10 +51,21 @@ public:
     [[nodiscard]] const WantedPiece& Wanted() const { return wanted_; }
     void End() noexcept;
 
-    // Going in: the values of one iteration after another.
-    void StartExecute(const BoundText& text, const ExecuteArguments& arguments);
+    // Whether a callback is under way.
+    [[nodiscard]] bool Asks() const { return asks_; }
+    // The area must be that of the handle that is wanted.
+    Status SetPlace(DataArea& area, const PieceBuffer& place);
+
+    // Values of binds, one iteration after another: Collect, run it, StartDelivery, Deliver. 24369 when a callback is
+    // missing beside one that is there.
+    Status StartExecute(const BoundText& text, const ExecuteArguments& arguments);
     // Ok when all values of the iteration are there.
     Status Collect(PieceDriver& driver);
+    // What the iteration gave the targets, or, of a block, what its variables hold.
+    void StartDelivery(bool is_block);
+    void ForgetReturned() noexcept;    // the iteration failed
+    [[nodiscard]] bool Delivers() const { return wanted_.out; }
+    Status Deliver(PieceDriver& driver);
     void NextIteration() noexcept;
     [[nodiscard]] const ExecuteArguments& Arguments() const { return arguments_; }
 
@@ -88,20 +77,39 @@ public:
     [[nodiscard]] ub4 Row() const { return wanted_.iteration; }
     [[nodiscard]] ub4 EndRow() const { return arguments_.iterations; }
 
+    // Whether a value was cut because its area, or a callback, had no more room for it, since StartFetch or StartExecute.
+    [[nodiscard]] bool Warned() const { return warned_; }
+    void Warn() noexcept { warned_ = true; }
+
 private:
     void EndUnlessLiving() noexcept;
-    // Both answer an error's number or 0.
+    [[nodiscard]] bool AllLiving() const noexcept;
+    Status Fail(int error) noexcept;
+    Status Ask(PieceDriver& driver);
+    void ForgetValues() noexcept;
+    Status CollectPiece(BindArea& bind, PieceDriver& driver);
+    bool NextReturned();
+    Status HandPieces(PieceDriver& driver);
+    // These answer an error's number or 0.
+    int AppendPiece(WholeValue& whole, const PieceBuffer& place, bool by_callback);
     int NextValue(const Defines& defines);
     int TakePiece(bool& value_ends);
+    int EndCut(const PieceBuffer& place);
 
+    const void* const statement_;
     Use use_ = Use::none;
+    bool asks_ = false;
+    bool warned_ = false;
     WantedPiece wanted_;
     std::uint64_t seen_ = 0;    // erased objects when the handles that Wants looks at were found living
     ExecuteArguments arguments_{};
-    // going in
-    std::vector<std::shared_ptr<BindArea>> binds_;    // that take pieces, in order of the placeholders
-    std::size_t bind_ = 0;
-    // coming out
+    // binds, in order of the placeholders
+    std::vector<std::shared_ptr<BindArea>> ins_;
+    std::vector<std::shared_ptr<BindArea>> outs_;
+    std::size_t bind_ = 0;        // the next one to look at
+    std::size_t returned_ = 0;    // elements of the iteration that come out
+    ub1 begun_with_ = 0;          // the piece that the value began with, while it is the only one
+    // rows
     OwnRow row_;
     std::size_t define_ = 0;           // the next one to look at
     bool is_null_ = false;

@@ -1,5 +1,7 @@
 // Statements: executes and fetches whose values go in pieces. They end with OCI_NEED_DATA where the driver waits for the
 // application, and go on with the next call of the same function.
+#include <exception>
+
 #include "handles/errors.h"
 #include "statements/fetch_sink.h"
 
@@ -12,22 +14,12 @@ Status Statement::GetPieceInfo(PieceInfo& info) {
             wanted.area->HandleType(),
             static_cast<ub1>(wanted.out ? OCI_PARAM_OUT : OCI_PARAM_IN),
             wanted.iteration,
-            0,
+            wanted.index,
             static_cast<ub1>(wanted.continued ? OCI_NEXT_PIECE : OCI_ONE_PIECE)};
     return {};
 }
 
-Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) {
-    if (pieces_.Wants() == PieceStream::Use::none) return Error(errors::kIllegalOperation);
-    const WantedPiece& wanted = pieces_.Wanted();
-    if (wanted.area != &area || piece.piece > OCI_LAST_PIECE) return Error(errors::kIllegalOperation);
-    const bool null_in = !wanted.out && SaysNull(piece);
-    if (!null_in && !piece.length) return Error(errors::kBadLength);
-    if (!null_in && !piece.buffer) return Error(errors::kBadBuffer);
-    area.piece = piece;
-    area.piece.is_set = true;
-    return {};
-}
+Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) { return pieces_.SetPlace(area, piece); }
 
 // ---- Fetching
 
@@ -41,10 +33,15 @@ Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* p
 
 // Ok when the row is there.
 Status Statement::NextRowInPieces(ub4 row, const std::uint64_t* position) {
+    if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) {
+        pieces_.End();
+        return status;
+    }
     FetchSink sink(*this, row, true);
     std::uint32_t delivered = 0;
     Status status = position ? run_.cursor.ReadFrom(*position, sink, 1, delivered) : run_.cursor.Read(sink, 1, delivered);
     if (status.Ok() && delivered == 0) status = EndOfFetch();
+    if (!sink.Warned().Ok()) pieces_.Warn();
     if (!status.Ok()) pieces_.End();
     return status;
 }
@@ -63,43 +60,75 @@ Status Statement::ContinueFetch() {
         status = NextRowInPieces(next, nullptr);
         if (status.Ok()) status = pieces_.HandOut(defines_, driver_);
     }
+    if (status.Ok() && pieces_.Warned()) return Warning(errors::kTruncationWarning);
     return status;
 }
 
 // ---- Executing
 
+namespace {
+
+// Ends a stream when what was under way is left by an exception.
+class EndedByException {
+public:
+    explicit EndedByException(PieceStream& pieces) : pieces_(pieces) {}
+    ~EndedByException() { if (std::uncaught_exceptions() > before_) pieces_.End(); }
+    EndedByException(const EndedByException&) = delete;
+    EndedByException& operator=(const EndedByException&) = delete;
+
+private:
+    PieceStream& pieces_;
+    const int before_ = std::uncaught_exceptions();
+};
+
+}  // namespace
+
 Status Statement::StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments) {
-    pieces_.StartExecute(text_, arguments);
+    if (Status status = pieces_.StartExecute(text_, arguments); !status.Ok()) return status;
     ForgetOutcome();
     return ContinueExecute(error);
 }
 
-// Changes run row by row as their values come; anything else needs the values of one row.
-Status Statement::ContinueExecute(ErrorHandle& error) {
-    for (bool more = true;;) {
-        if (Status status = pieces_.Collect(driver_); !status.Ok()) return status;
-        Status status = RunCollected(error, more);
-        if (!more) return status;
-        pieces_.NextIteration();
-    }
+// Changes and blocks run iteration by iteration as their values come; anything else needs the values of one.
+bool Statement::RunsByIteration() const {
+    const ExecuteArguments& arguments = pieces_.Arguments();
+    return (Scanned().is_block || Scanned().steps[0].run == sql::Run::change) && arguments.first < arguments.iterations;
 }
 
-// All values of an iteration are there: runs it; `more` when there is another.
-Status Statement::RunCollected(ErrorHandle& error, bool& more) {
+Status Statement::ContinueExecute(ErrorHandle& error) {
+    const EndedByException guard(pieces_);
     const ExecuteArguments arguments = pieces_.Arguments();
-    const bool by_row = !Scanned().is_block && Scanned().steps[0].run == sql::Run::change;
-    more = false;
-    if (!by_row || arguments.iterations <= arguments.first) {
-        pieces_.End();
-        return Run(error, arguments);
+    Status status;
+    for (bool stopped = false;;) {
+        if (!pieces_.Delivers()) {
+            if (status = pieces_.Collect(driver_); !status.Ok()) return status;
+            if (!RunsByIteration()) {
+                pieces_.End();
+                return Run(error, arguments);
+            }
+            if (status = RunCollected(stopped); stopped) break;
+            pieces_.StartDelivery(Scanned().is_block);
+        }
+        if (status = pieces_.Deliver(driver_); !status.Ok()) return status;
+        if (pieces_.Wanted().iteration + 1 >= arguments.iterations) break;
+        pieces_.NextIteration();
     }
-    const ub4 row = pieces_.Wanted().iteration;
-    Status status = RunRows({row + 1, row, arguments.mode});
-    run_.row_count = outcome_.affected;
-    const bool stop = status.Failed() || (!outcome_.failures.empty() && !(arguments.mode & OCI_BATCH_ERRORS));
-    more = !stop && row + 1 < arguments.iterations;
-    if (more) return {};
     pieces_.End();
     if (status.Failed()) return status;
-    return Complete(Finish(error, arguments), arguments);
+    if (!Scanned().is_block) status = Finish(error, arguments);
+    if (status.Ok() && pieces_.Warned()) status = Warning(errors::kTruncationWarning);
+    return Complete(std::move(status), arguments);
+}
+
+// All values of an iteration are there: runs it. `stopped` when no other follows.
+Status Statement::RunCollected(bool& stopped) {
+    const ub4 row = pieces_.Wanted().iteration;
+    const ub4 mode = pieces_.Arguments().mode;
+    const std::uint32_t done_before = outcome_.executed;
+    const bool is_block = Scanned().is_block;
+    Status status = is_block ? RunBlock({row + 1, row, mode}) : RunRows({row + 1, row, mode});
+    if (!is_block) run_.row_count = outcome_.affected;
+    if (!is_block && outcome_.executed == done_before) pieces_.ForgetReturned();
+    stopped = status.Failed() || (!outcome_.failures.empty() && !(mode & OCI_BATCH_ERRORS));
+    return status;
 }

@@ -44,6 +44,9 @@ public:
     [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
     void LinkClosed() noexcept override;
 
+    // What every call on the statement's handle asks first: 3127 while a callback of it runs.
+    [[nodiscard]] Status Admit() const { return pieces_.Asks() ? Error(errors::kOperationActive) : Status(); }
+
     // Text. Binds and defines made before are no longer part of the statement.
     Status Prepare(std::string_view text);
     [[nodiscard]] const std::string& Text() const { return text_.Text(); }
@@ -173,7 +176,8 @@ private:
     Status ContinueFetch();
     Status StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments);
     Status ContinueExecute(ErrorHandle& error);
-    Status RunCollected(ErrorHandle& error, bool& more);
+    Status RunCollected(bool& stopped);
+    [[nodiscard]] bool RunsByIteration() const;
 
     std::shared_ptr<StatementShare> share_;    // once a handle needs it
     BoundText text_;
@@ -182,8 +186,8 @@ private:
     bool described_ = false;            // the select list is known, executed or not
     std::uint32_t parse_error_offset_ = 0;    // in the UTF-8 text
     Execution run_;
-    PieceStream pieces_;
+    PieceStream pieces_{this};
     engine::ArrayOutcome outcome_;    // of the execute; of one in pieces, what its iterations did so far
-    PollingDriver driver_;
+    CallbackDriver driver_;
     Parameters parameters_;    // by position - 1
 };

@@ -11,9 +11,39 @@ Status Targets::FindPlaces(std::size_t columns) {
         if (!text_.IsBound(step_.targets[target])) return Error(errors::kNotAllBound);
         BindArea& bind = *text_.At(step_.targets[target]);
         bind.workspace.column = values::ClassOf(query_.Columns()[target].type);
-        places_.push_back({&bind, values::ForColumn(*bind.Type()->out, bind.workspace.column)});
+        Place& place = places_.emplace_back(Place{&bind, values::ForColumn(*bind.Type()->out, bind.workspace.column), {}});
+        if (bind.InPieces()) place.renderers = values::ForColumn(*bind.Type()->pieces, bind.workspace.column);
+        if (bind.InPieces()) bind.out.clear();
     }
     return {};
+}
+
+// A value that goes out in pieces, in the application's form.
+int Targets::Keep(const Place& place, std::uint32_t element, const engine::Datum& value) {
+    BindArea& bind = *place.bind;
+    if (bind.out.size() <= element) bind.out.resize(std::size_t{element} + 1);
+    WholeValue& whole = bind.out[element];
+    whole.is_given = true;
+    whole.is_null = value.kind == engine::Kind::null;
+    whole.bytes.clear();
+    if (whole.is_null) return 0;
+    std::string_view text;
+    int error = place.renderers[static_cast<std::size_t>(value.kind)](value, bind.workspace, text);
+    if (error == 0 && bind.Type()->family == values::Family::text)
+        error = values::ToApplication(text, bind.workspace, text);
+    if (error == 0) whole.bytes = text;
+    return error;
+}
+
+void Targets::Settle() {
+    for (const Place& place : places_) {
+        if (!place.bind->InPieces()) continue;
+        std::vector<WholeValue>&in = place.bind->in, &out = place.bind->out;
+        if (in.size() < out.size()) in.resize(out.size());
+        for (std::size_t element = 0; element < out.size(); ++element)
+            if (out[element].is_given) in[element] = std::move(out[element]);
+        out.clear();
+    }
 }
 
 // How many rows there is room for.
@@ -36,7 +66,11 @@ Status Targets::Row(std::uint32_t execution, std::span<const engine::Datum> valu
         BindArea& bind = *places_[target].bind;
         const std::uint32_t table = layout_ == Layout::tables ? rows_ : table_;
         const std::uint32_t element = bind.IsTable() ? table : by_execution ? execution : plain_;
-        const int error = values::Store(bind.elements, element, places_[target].converters, bind.workspace, values[target]);
+        const Place& place = places_[target];
+        const bool is_block = text_.Scanned().is_block;
+        const int error = bind.InPieces()
+                              ? Keep(place, !is_block ? rows_ : bind.IsTable() ? element : 0, values[target])
+                              : values::Store(bind.elements, element, place.converters, bind.workspace, values[target]);
         if (error != 0 && error != errors::kTruncationWarning) return Error(error);
     }
     of_execution_ = execution == execution_ && rows_ > 0 ? of_execution_ + 1 : 1;

@@ -1,5 +1,6 @@
 // Rows that a statement gives back, into the binds of a step's targets: `returning ... into`, `select ... into`,
-// assignments. A value that does not fit its place is the failure of the execution that gave it.
+// assignments. A value that does not fit its place is the failure of the execution that gave it. What goes out in pieces
+// is kept with its bind, a value for each row.
 //
 // Threads: under the statement's serial lock.
 #pragma once
@@ -26,6 +27,9 @@ public:
     // 1422 for a row more than one, 1414 for one more than the tables have room for.
     Status Row(std::uint32_t execution, std::span<const engine::Datum> values) override;
 
+    // To be called in a block when the step is done: what it gave to variables in pieces is what they hold now.
+    void Settle();
+
     // How many rows came in all, and from an execution if it was the last that gave any.
     [[nodiscard]] std::uint32_t Rows() const { return rows_; }
     [[nodiscard]] std::uint32_t RowsOf(std::uint32_t execution) const { return execution == execution_ ? of_execution_ : 0; }
@@ -34,8 +38,10 @@ private:
     struct Place {
         BindArea* bind;
         values::ByKind<values::OutConverter> converters;
+        values::ByKind<values::Renderer> renderers;    // of binds in pieces
     };
     Status FindPlaces(std::size_t columns);
+    int Keep(const Place& place, std::uint32_t element, const engine::Datum& value);
     [[nodiscard]] std::uint32_t Most() const;
 
     const BoundText& text_;

@@ -1,0 +1,385 @@
+// Binds and defines whose places callbacks give: what they are asked, what becomes of their answers, and what they may
+// do meanwhile.
+#include <functional>
+
+#include "support/statement_fixture.h"
+
+namespace {
+
+using std::string;
+
+// A callback for either direction. It notes what it is asked: iteration, index, piece.
+struct Callback {
+    struct Place {
+        dvoid* buffer = nullptr;
+        ub4 length = 0;
+        ub1 piece = 0;
+        dvoid* indicator = nullptr;
+    };
+    std::function<sb4(Place&)> act;
+    string asked;
+    Place place;    // of the last call; its length lives here
+    ub2 code = 9;
+
+    sb4 Ask(ub4 iteration, ub4 index, ub1 piece) {
+        asked += std::to_string(iteration) + "." + std::to_string(index) + "." + std::to_string(piece) + " ";
+        Place given{nullptr, 0, piece, nullptr};
+        const sb4 answer = act(given);
+        place = given;
+        return answer;
+    }
+    static sb4 In(dvoid* context, OCIBind*, ub4 iteration, ub4 index, dvoid** buffer, ub4* length, ub1* piece,
+                  dvoid** indicator) {
+        auto& self = *static_cast<Callback*>(context);
+        const sb4 answer = self.Ask(iteration, index, *piece);
+        *buffer = self.place.buffer, *length = self.place.length, *piece = self.place.piece;
+        *indicator = self.place.indicator;
+        return answer;
+    }
+    static sb4 Out(dvoid* context, OCIBind*, ub4 iteration, ub4 index, dvoid** buffer, ub4** length, ub1* piece,
+                   dvoid** indicator, ub2** code) {
+        auto& self = *static_cast<Callback*>(context);
+        const sb4 answer = self.Ask(iteration, index, *piece);
+        *buffer = self.place.buffer, *length = &self.place.length, *piece = self.place.piece;
+        *indicator = self.place.indicator, *code = &self.code;
+        return answer;
+    }
+    static sb4 Define(dvoid* context, OCIDefine*, ub4 row, dvoid** buffer, ub4** length, ub1* piece, dvoid** indicator,
+                      ub2** code) {
+        return Out(context, nullptr, row, 0, buffer, length, piece, indicator, code);
+    }
+};
+
+// Gives pieces one after another: "=" marks a whole value, "<" a first piece, "+" a next and ">" a last one, "0" a null.
+struct Giver : Callback {
+    explicit Giver(std::vector<string> given) : pieces(std::move(given)) {
+        act = [this](Place& out) {
+            const string& piece = pieces.at(next++);
+            out.piece = static_cast<ub1>(string("=<+>").find(piece[0]));
+            if (piece == "0") out.piece = OCI_ONE_PIECE, out.indicator = &null;
+            out.buffer = const_cast<char*>(piece.data()) + 1;
+            out.length = static_cast<ub4>(piece.size()) - 1;
+            return OCI_CONTINUE;
+        };
+    }
+    std::vector<string> pieces;
+    std::size_t next = 0;
+    sb2 null = -1;
+};
+
+// Takes values in pieces of at most `room` bytes: `all` gets them, with | behind each and - for a null. Nothing but the
+// piece's bytes is touched.
+struct Taker : Callback {
+    explicit Taker(ub4 size) : room(size) {
+        act = [this](Place& out) {
+            if (out.piece == OCI_ONE_PIECE) Flush();
+            else all += Bytes();
+            buffer.assign(room + 1, '#');
+            indicator = 9;
+            out = {buffer.data(), room, out.piece, &indicator};
+            return OCI_CONTINUE;
+        };
+    }
+    [[nodiscard]] string Bytes() const {
+        EXPECT_EQ(buffer.back(), '#');
+        return buffer.substr(0, place.length);
+    }
+    string Flush() {
+        if (!buffer.empty()) all += indicator == -1 ? "-|" : Bytes() + "|";
+        buffer.clear();
+        return all;
+    }
+    ub4 room;
+    string buffer, all;
+    sb2 indicator = 9;
+};
+
+class Dynamic : public StatementTest {
+protected:
+    explicit Dynamic(ub4 mode = OCI_DEFAULT) : StatementTest(mode) {}
+
+    sb4 BindTo(ub4 position, Callback* in, Callback* out, ub2 type = SQLT_CHR) {
+        OCIBind*& bind = binds_[position];
+        bind = nullptr;
+        const sb4 answer = Bind(&bind, position, InPieces(type));
+        return answer != 0 ? answer : Answer(OCIBindDynamic(bind, err, in, in ? Callback::In : nullptr, out,
+                                                            out ? Callback::Out : nullptr));
+    }
+    sb4 DefineTo(ub4 position, Callback& taker, ub2 type = SQLT_CHR) {
+        OCIDefine*& define = defines_[position];
+        define = nullptr;
+        const sb4 answer = Define(&define, position, InPieces(type));
+        return answer != 0 ? answer : Answer(OCIDefineDynamic(define, err, &taker, Callback::Define));
+    }
+    OCIBind* binds_[4] = {};
+    OCIDefine* defines_[4] = {};
+};
+
+// One ask for each piece: of the same iteration until the value ends. A callback that goes by the iteration alone gives
+// its piece again, or begins with a piece that is none to begin with: that is the whole value.
+TEST_F(Dynamic, ValuesGoInByIteration) {
+    const struct { ub4 rows; std::vector<string> given; const char *asked, *stored; sb4 answer; } cases[] = {
+        {3, {"=one", "0", "=three"}, "0.0.0 1.0.0 2.0.0 ", "one,-,three", 0},
+        {2, {"<a", "+bc", "+", ">d", "=e"}, "0.0.0 0.0.2 0.0.2 0.0.2 1.0.0 ", "abcd,e", 0},
+        {1, {"<a", "+a", "+a", ">"}, "0.0.0 0.0.2 0.0.2 0.0.2 ", "aaa", 0},
+        {3, {"+one", "+one", "<two", "<two", ">three"}, "0.0.0 0.0.2 1.0.0 1.0.2 2.0.0 ", "one,two,three", 0},
+        {2, {"+a", "+b", ">c", "="}, "0.0.0 0.0.2 0.0.2 1.0.0 ", "abc,-", 0},
+        {2, {"=a", "<b", "<c"}, "0.0.0 1.0.0 1.0.2 ", "a", 24370},
+        {2, {"=a", "<b", "=b"}, "0.0.0 1.0.0 1.0.2 ", "a", 24370},
+        {1, {"<b", "+c", "+c", "<c"}, "0.0.0 0.0.2 0.0.2 0.0.2 ", "-", 24370}};
+    for (const auto& c : cases) {
+        MustRun("create table t(id number, a varchar2(40))");
+        std::vector<sb4> ids(c.rows, 1);
+        Giver giver(c.given);
+        ASSERT_EQ(Prepare("insert into t values(:1, :2)"), 0);
+        ASSERT_EQ(Bind(1, {ids.data(), 4, SQLT_INT}), 0);
+        ASSERT_EQ(BindTo(2, &giver, nullptr), 0);
+        EXPECT_EQ(Execute(c.rows), c.answer) << c.asked;
+        EXPECT_EQ(giver.asked, c.asked);
+        EXPECT_EQ(One("select group_concat(nvl(a, '-'), ',') from t"), c.stored);
+        MustRun("drop table t");
+    }
+}
+
+TEST_F(Dynamic, RowsComeOutByCallbacks) {
+    MustRun("create table t(id number, a varchar2(40), b raw(20), c clob)",
+            "insert into t values(1, 'abcdefg', '0102', 'text one'), (2, null, null, null), (3, 'x', 'FF', null)");
+    for (const ub4 rows : {1, 2, 3}) {
+        Taker a(3), b(20), c(4);
+        sb4 ids[3] = {};
+        ASSERT_EQ(Prepare("select a, b, c, id from t order by id"), 0);
+        ASSERT_EQ(DefineTo(1, a), 0);
+        ASSERT_EQ(DefineTo(2, b, SQLT_LBI), 0);
+        ASSERT_EQ(DefineTo(3, c, SQLT_LNG), 0);
+        ASSERT_EQ(Define(4, Int(ids)), 0);
+        ASSERT_EQ(Execute(0), 0);
+        sword rc = OCI_SUCCESS;
+        for (ub4 done = 0; rc == OCI_SUCCESS && done < 3; done += RowsFetched()) rc = FetchCode(rows);
+        EXPECT_EQ(a.Flush(), "abcdefg|-|x|");
+        EXPECT_EQ(b.Flush(), string("\1\2|-|\xff|"));
+        EXPECT_EQ(c.Flush(), "text one|-|-|");
+        EXPECT_EQ(ids[(3 - 1) % rows], 3);
+        EXPECT_EQ(a.asked, rows == 1 ? "0.0.0 0.0.2 0.0.2 0.0.0 0.0.0 "
+                           : rows == 2 ? "0.0.0 0.0.2 0.0.2 1.0.0 0.0.0 " : "0.0.0 0.0.2 0.0.2 1.0.0 2.0.0 ");
+        EXPECT_EQ(a.code, 0);
+        EXPECT_EQ(c.code, 1405);
+    }
+}
+
+// The rows of each iteration are counted before they come out, row by row; a plain bind beside keeps the last.
+TEST_F(Dynamic, ReturningFeedsRowsByIteration) {
+    MustRun("create table t(id number, a varchar2(40))", "insert into t values(1, 'one'), (1, 'uno'), (2, 'two'), (3, null)");
+    sb4 ids[3] = {1, 7, 3}, last[3] = {};
+    for (const bool asks_in : {false, true}) {
+        Taker taker(2);
+        string counts;
+        const auto take = taker.act;
+        taker.act = [&](Callback::Place& out) {
+            counts += std::to_string(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, binds_[2], OCI_HTYPE_BIND));
+            return take(out);
+        };
+        Giver nulls({"0", "0", "0"});
+        ASSERT_EQ(Prepare("update t set a = a where id = :1 returning a, id into :2, :3"), 0);
+        ASSERT_EQ(Bind(1, Int(ids)), 0);
+        ASSERT_EQ(BindTo(2, asks_in ? &nulls : nullptr, &taker), 0);
+        ASSERT_EQ(Bind(3, Int(last)), 0);
+        EXPECT_EQ(Execute(3), 0);
+        EXPECT_EQ(taker.asked, "0.0.0 0.0.2 0.1.0 0.1.2 2.0.0 ");
+        EXPECT_EQ(counts, "22221");
+        EXPECT_EQ(taker.Flush(), "one|uno|-|");
+        EXPECT_EQ(nulls.asked, asks_in ? "0.0.0 1.0.0 2.0.0 " : "");
+        EXPECT_EQ(RowCount(), 3u);
+        EXPECT_EQ(last[2], 3);
+    }
+}
+
+// Variables of a block: what goes in is read, what was assigned comes out; elements of tables each in their turn.
+TEST_F(Dynamic, BlocksAndTables) {
+    MustRun("create table t(a varchar2(40))");
+    Giver giver({"<ab", ">c", "=x"}), elements({"=p", "=q", "=r", "=s"});
+    Taker taker(10), rows(10);
+    ub4 count = 2;
+    ASSERT_EQ(Prepare("begin :v := :v || :v; insert into t values(:v); insert into t values(:e) returning a || '!' into :e; end;"), 0);
+    ASSERT_EQ(BindTo(1, &giver, &taker), 0);
+    ASSERT_EQ(Bind(&binds_[2], 2, InPieces(SQLT_CHR), OCI_DEFAULT, 2, &count), 0);
+    ASSERT_EQ(Answer(OCIBindDynamic(binds_[2], err, &elements, Callback::In, &rows, Callback::Out)), 0);
+    ASSERT_EQ(Execute(2), 0);
+    EXPECT_EQ(elements.asked, "0.0.0 0.1.0 1.0.0 1.1.0 ");
+    EXPECT_EQ(rows.asked, elements.asked);
+    EXPECT_EQ(rows.Flush(), "p!|q!|r!|s!|");
+    EXPECT_EQ(taker.Flush(), "abcabc|xx|");
+    EXPECT_EQ(One("select group_concat(a, ',') from t"), "abcabc,p,q,xx,r,s");
+}
+
+// Binds without callbacks are polled in their turn, in either direction.
+TEST_F(Dynamic, PollingBesideCallbacks) {
+    MustRun("create table t(a varchar2(40), b varchar2(40))");
+    Giver giver({"=a0", "=a1"});
+    Taker taker(9);
+    ASSERT_EQ(Prepare("insert into t values(:1, :2) returning a, b into :3, :4"), 0);
+    ASSERT_EQ(BindTo(1, &giver, nullptr), 0);
+    ASSERT_EQ(BindTo(2, nullptr, nullptr), 0);
+    ASSERT_EQ(Bind(&binds_[3], 3, InPieces(SQLT_CHR)), 0);
+    OCIBind* last = nullptr;
+    ASSERT_EQ(Bind(&last, 4, InPieces(SQLT_CHR)), 0);
+    ASSERT_EQ(Answer(OCIBindDynamic(last, err, nullptr, nullptr, &taker, Callback::Out)), 0);
+    for (ub4 row = 0; row < 2; ++row) {
+        for (const ub1 direction : {OCI_PARAM_IN, OCI_PARAM_OUT}) {
+            const bool waits = row == 1 && direction == OCI_PARAM_IN;
+            EXPECT_EQ(waits ? OCI_NEED_DATA : ExecuteCode(2), OCI_NEED_DATA);
+            dvoid* handle = nullptr;
+            ub4 iteration = 9, index = 9, length = 2;
+            ub1 in_out = 0;
+            char buffer[] = "b0";
+            ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, nullptr, &in_out, &iteration, &index, nullptr)), 0);
+            EXPECT_EQ(handle, binds_[direction == OCI_PARAM_IN ? 2 : 3]);
+            EXPECT_EQ(in_out, direction);
+            EXPECT_EQ(iteration * 10 + index, row * 10);
+            const auto set = [&](ub1 piece) {
+                return Answer(OCIStmtSetPieceInfo(handle, OCI_HTYPE_BIND, err, buffer, &length, piece, nullptr, nullptr));
+            };
+            if (direction == OCI_PARAM_IN) {
+                EXPECT_EQ(set(OCI_NEXT_PIECE), 24370);
+                EXPECT_EQ(set(OCI_LAST_PIECE), 24370);
+            }
+            ASSERT_EQ(set(OCI_ONE_PIECE), 0);
+            if (direction == OCI_PARAM_IN) continue;
+            EXPECT_EQ(ExecuteCode(2), row == 0 ? OCI_NEED_DATA : OCI_SUCCESS);
+            EXPECT_EQ(string(buffer, length), row == 0 ? "a0" : "a1");
+        }
+    }
+    EXPECT_EQ(taker.Flush(), "b0|b0|");
+}
+
+// A name that stands twice is asked for once; iterations count from the row offset.
+TEST_F(Dynamic, RepeatedNamesAndRowOffset) {
+    MustRun("create table t(a varchar2(40), b varchar2(40), c varchar2(40))");
+    Giver giver({"=x", "=y"});
+    char plain[3][2] = {"0", "1", "2"};
+    ASSERT_EQ(Prepare("insert into t values(:v, :w, :v)"), 0);
+    const auto& v = InPieces(SQLT_CHR);
+    ASSERT_EQ(Answer(OCIBindByName(stmt, &binds_[1], err, Bytes(":v"), 2, nullptr, v.size, v.type, nullptr, nullptr,
+                                   nullptr, 0, nullptr, OCI_DATA_AT_EXEC)), 0);
+    ASSERT_EQ(BindName(":w", Text(plain)), 0);
+    ub4 iteration = 9;
+    EXPECT_EQ(ExecuteCode(3, OCI_DEFAULT, 1), OCI_NEED_DATA);
+    ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, nullptr, nullptr, nullptr, &iteration, nullptr, nullptr)), 0);
+    EXPECT_EQ(iteration, 1u);
+    ASSERT_EQ(Answer(OCIBindDynamic(binds_[1], err, &giver, Callback::In, nullptr, nullptr)), 0);
+    char first[] = "w";
+    ub4 length = 1;
+    EXPECT_EQ(Answer(OCIStmtSetPieceInfo(binds_[1], OCI_HTYPE_BIND, err, first, &length, 0, nullptr, nullptr)), 24370)
+        << "a callback gives it now";
+    EXPECT_EQ(Execute(3, OCI_DEFAULT, 1), 0);
+    EXPECT_EQ(giver.asked, "1.0.0 2.0.0 ");
+    EXPECT_EQ(One("select group_concat(a || b || c, ',') from t"), "x1x,y2y");
+}
+
+// What a callback must not answer, in either direction; a place is not looked at where the value is null.
+TEST_F(Dynamic, AnswersThatAreRefused) {
+    MustRun("create table t(a varchar2(40))");
+    char room[4] = "xyz";
+    sb2 null = -1;
+    const struct { sb4 code; dvoid* buffer; ub4 length; ub1 piece; dvoid* indicator; sb4 in, out; } cases[] = {
+        {OCI_CONTINUE, room, 3, OCI_ONE_PIECE, nullptr, 0, 0}, {OCI_SUCCESS, room, 3, OCI_ONE_PIECE, nullptr, 24343, 24343},
+        {OCI_ERROR, room, 3, OCI_ONE_PIECE, nullptr, 24343, 24343}, {OCI_CONTINUE, nullptr, 3, OCI_ONE_PIECE, nullptr, 24306, 24306},
+        {OCI_CONTINUE, nullptr, 0, OCI_ONE_PIECE, nullptr, 0, 24306}, {OCI_CONTINUE, room, 0, OCI_ONE_PIECE, nullptr, 0, 24307},
+        {OCI_CONTINUE, nullptr, 9, OCI_ONE_PIECE, &null, 0, 24306}, {OCI_CONTINUE, room, 3, 4, nullptr, 24370, 0}};
+    for (const auto& c : cases) {
+        Callback callback;
+        callback.act = [&](Callback::Place& out) {
+            out = {c.buffer, c.length, c.piece, c.indicator};
+            return c.code;
+        };
+        ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
+        ASSERT_EQ(BindTo(1, &callback, nullptr), 0);
+        EXPECT_EQ(Execute(2), c.in);
+        EXPECT_EQ(RowCount(), c.in == 0 ? 2u : 0u);
+        ASSERT_EQ(Prepare("select 'abc' from dual union all select 'def' from dual"), 0);
+        ASSERT_EQ(DefineTo(1, callback), 0);
+        ASSERT_EQ(Execute(0), 0);
+        EXPECT_EQ(Fetch(), c.out);
+        EXPECT_EQ(RowsFetched(), c.out == 0 ? 1u : 0u);
+        EXPECT_EQ(Fetch(), c.out) << "the next row";
+        ASSERT_EQ(Prepare("insert into t values('abc') returning a into :1"), 0);
+        ASSERT_EQ(BindTo(1, nullptr, &callback), 0);
+        EXPECT_EQ(Execute(), c.out);
+    }
+}
+
+TEST_F(Dynamic, CallbacksThatAreMissing) {
+    MustRun("create table t(a varchar2(40))");
+    Giver giver({"=x"});
+    Taker taker(9);
+    char area[9] = "x";
+    ASSERT_EQ(Prepare("insert into t values(:1) returning a into :2"), 0);
+    ASSERT_EQ(Bind(&binds_[1], 1, Text(area)), 0);
+    EXPECT_EQ(Answer(OCIBindDynamic(binds_[1], err, nullptr, Callback::In, nullptr, nullptr)), 24305);
+    EXPECT_EQ(OCIBindDynamic(nullptr, err, nullptr, Callback::In, nullptr, nullptr), OCI_INVALID_HANDLE);
+    ASSERT_EQ(BindTo(1, nullptr, &taker), 0);
+    EXPECT_EQ(Execute(), 24369);
+    ASSERT_EQ(BindTo(1, &giver, nullptr), 0);
+    ASSERT_EQ(BindTo(2, &giver, nullptr), 0);
+    EXPECT_EQ(Execute(), 24369);
+    EXPECT_EQ(giver.asked, "");
+    ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR)), 0);    // anew: nothing is registered any more
+    ASSERT_EQ(BindTo(2, nullptr, &taker), 0);
+    EXPECT_EQ(ExecuteCode(), OCI_NEED_DATA);
+    OCIDefine* define = nullptr;
+    ASSERT_EQ(Define(&define, 1, Text(area)), 0);
+    EXPECT_EQ(Answer(OCIDefineDynamic(define, err, nullptr, Callback::Define)), 24305);
+    EXPECT_EQ(OCIDefineDynamic(define, nullptr, nullptr, Callback::Define), OCI_INVALID_HANDLE);
+}
+
+// What callbacks do to what calls them. The statement itself is closed; the rest of the session is not.
+TEST_F(Dynamic, CallbacksThatCallTheLibrary) {
+    constexpr sb4 kNotAsked = -1;
+    MustRun("create table t(a varchar2(40))");
+    sb4 numbers[2] = {};
+    OCIBind* plain_bind = nullptr;
+    OCIDefine* plain_define = nullptr;
+    const struct { std::function<sb4()> act; sb4 answer, in, out, number; } cases[] = {
+        {[&] { return Fetch(); }, 3127, 0, 0, 8}, {[&] { return Execute(); }, 3127, 0, 0, 8},
+        {[&] { return Prepare("select 1 from dual"); }, 3127, 0, 0, 8},
+        {[&] { return Bind(1, Int(numbers)); }, 3127, 0, 0, 8}, {[&] { return Define(1, Int(numbers)); }, 3127, 0, 0, 8},
+        {[&] { return One("select 'other' from dual") == "other" ? 0 : 1; }, 0, 0, 0, 8},
+        {[&] { return OCIHandleFree(binds_[1], OCI_HTYPE_BIND); }, 0, 1008, kNotAsked, 0},
+        {[&] { return OCIHandleFree(plain_bind, OCI_HTYPE_BIND); }, 0, 1008, kNotAsked, 0},
+        {[&] { return OCIHandleFree(defines_[1], OCI_HTYPE_DEFINE); }, 0, kNotAsked, 0, 8},
+        {[&] { return OCIHandleFree(plain_define, OCI_HTYPE_DEFINE); }, 0, kNotAsked, 0, 7},
+        {[&] { return OCIHandleFree(stmt, OCI_HTYPE_STMT); }, 0, 24370, 24370, 7},
+        {[&] { return Answer(OCILogoff(svc, err)); }, 0, 3114, kNotAsked, 0},
+        {[&] { return Answer(OCILogoff(svc, err)); }, 0, kNotAsked, 3114, 7}};
+    for (const auto& c : cases) {
+        Callback callback;
+        char room[] = "xyz";
+        sb4 answered = -1;
+        callback.act = [&](Callback::Place& out) {
+            if (answered == -1) answered = c.act();
+            out = {room, 3, out.piece};
+            return OCI_CONTINUE;
+        };
+        if (c.in != kNotAsked) {
+            stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+            plain_bind = nullptr;
+            ASSERT_EQ(Prepare("insert into t values(:1 || :2)"), 0);
+            ASSERT_EQ(BindTo(1, &callback, nullptr), 0);
+            ASSERT_EQ(Bind(&plain_bind, 2, Int(numbers)), 0);
+            EXPECT_EQ(Execute(2), c.in) << &c - cases;
+            EXPECT_EQ(answered, c.answer) << &c - cases;
+            if (c.in == 3114) { ASSERT_EQ(Logon(&svc), OCI_SUCCESS); }
+        }
+        if (c.out == kNotAsked) continue;
+        stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        plain_define = nullptr, numbers[0] = numbers[1] = 0, answered = -1;
+        ASSERT_EQ(Prepare("select 'abc', 7 from dual union all select 'def', 8 from dual"), 0);
+        ASSERT_EQ(DefineTo(1, callback), 0);
+        ASSERT_EQ(Define(&plain_define, 2, Int(numbers)), 0);
+        ASSERT_EQ(Execute(0), 0) << &c - cases;
+        EXPECT_EQ(Fetch(2), c.out) << &c - cases;
+        EXPECT_EQ(answered, c.answer) << &c - cases;
+        EXPECT_EQ(numbers[1] == 8 ? 8 : numbers[0], c.number) << &c - cases;
+    }
+}
+
+}  // namespace
