@@ -155,7 +155,9 @@ bool LacksCallback(const Binds& binds, bool comes_out) {
     });
 }
 
-ub4 ElementsOf(const BindArea& bind) { return bind.IsTable() ? *bind.current_elements : 1; }
+ub4 ElementsOf(const BindArea& bind) {
+    return bind.IsTable() ? std::min(*bind.current_elements, bind.most_elements) : 1;
+}
 
 }  // namespace
 
@@ -195,7 +197,7 @@ Status PieceStream::Collect(PieceDriver& driver) {
     for (; bind_ < ins_.size(); ++bind_) {
         BindArea& bind = *ins_[bind_];
         const ub4 elements = ElementsOf(bind);
-        if (bind.IsTable() && elements > bind.most_elements) return Fail(errors::kBadTableLength);
+        if (bind.IsTable() && *bind.current_elements > elements) return Fail(errors::kBadTableLength);
         if (bind.in.size() < elements) bind.in.resize(elements);
         while (wanted_.index < elements)
             if (Status status = CollectPiece(bind, driver); !status.Ok()) return status;

@@ -382,4 +382,27 @@ TEST_F(Dynamic, CallbacksThatCallTheLibrary) {
     }
 }
 
+class Utf16Dynamic : public Dynamic {
+protected:
+    Utf16Dynamic() : Dynamic(OCI_UTF16) {}
+};
+
+// Pieces may tear a character going in, and do not coming out.
+TEST_F(Utf16Dynamic, PiecesOfUnits) {
+    MustRun("create table t(a varchar2(40))");
+    const string text(reinterpret_cast<const char*>(u"a\U0001F600z"), 8);
+    Giver giver({"<" + text.substr(0, 3), "+" + text.substr(3, 2), ">" + text.substr(5)});
+    Taker returned(5), fetched(20);
+    ASSERT_EQ(Prepare("insert into t values(:1) returning a into :2"), 0);
+    ASSERT_EQ(BindTo(1, &giver, nullptr), 0);
+    ASSERT_EQ(BindTo(2, nullptr, &returned), 0);
+    ASSERT_EQ(Execute(), 0);
+    EXPECT_EQ(returned.Flush(), text + "|");
+    EXPECT_EQ(returned.asked, "0.0.0 0.0.2 0.0.2 ");
+    ASSERT_EQ(Prepare("select a || a from t"), 0);
+    ASSERT_EQ(DefineTo(1, fetched, SQLT_STR), 0);
+    ASSERT_EQ(Execute(1), 0);
+    EXPECT_EQ(fetched.Flush(), text + text + "|");
+}
+
 }  // namespace
