@@ -66,15 +66,13 @@ TEST(Trace, TheLineOfEveryFunction) {
         {"             envhp = x\n", "OCIThreadInit OCIThreadTerm OCIThreadIdSame"},
         {"             spoolhd = x\n", "OCISessionPoolCreate OCISessionPoolDestroy"},
         {"             poolhd = x\n", "OCIConnectionPoolCreate OCIConnectionPoolDestroy"},
-        {"             lda = x\n", "OCILdaToSvcCtx"},
-        {"             svchp = x\n", "OCISvcCtxToLda"},
+        {"             lda = x\n", "OCILdaToSvcCtx"}, {"             svchp = x\n", "OCISvcCtxToLda"},
         {"             lda = x, rc = -7\n",
          "olog ologof orol ocom ocon ocof obreak onbclr onbset onbtst sqllda odessp sqlld2"},
         {"             cda = x, rc = -7\n",
          "oopen oparse odescr oclose ogetpi osetpi odefinps odefin ocan oexec oexfet oexn ofen ofetch obindps "
          "obndra obndrv obndrn oopt"},
-        {"             cda = x\n", "getcda"},
-        {"             cursor = x, rc = -7\n", "oflng"},
+        {"             cda = x\n", "getcda"}, {"             cursor = x, rc = -7\n", "oflng"},
         {"             rc = -7\n", "opinit oermsg"},
         {"\n",
          "OCIInitialize OCITerminate OCIClientVersion OCIFileExists OCIFileGetLength OCIFileInit OCIFileTerm "

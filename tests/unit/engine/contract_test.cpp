@@ -109,6 +109,8 @@ TEST_P(Contract, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
     ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 1, .last = 5, .all_rows = true}, all).Ok());
     EXPECT_EQ(all.executed, 1u);
     EXPECT_EQ(all.affected, 11u) << "added to what was there";
+    ASSERT_TRUE(Prepared("savepoint here")->ExecuteArray(rows, {}, all).Ok());
+    EXPECT_EQ(all.affected, 11u) << "nothing is changed";
     ASSERT_EQ(all.failures.size(), 3u);
     EXPECT_EQ(all.failures[0].row, 1u);
     EXPECT_EQ(all.failures[1].row, 3u);
@@ -256,6 +258,7 @@ TEST_P(Contract, ReadOnlyTransactionRefusesChangesAndSeesWhatThereWas) {
         if (mode == TransactionMode::read_only) {
             EXPECT_EQ(Run("insert into t values(9)"), 1456);
             EXPECT_EQ(Run("delete from t where n < 0"), 1456);
+            EXPECT_EQ(Run("savepoint here"), 0) << "no change";
         }
         EXPECT_TRUE(connection_->InTransaction());
         ASSERT_EQ(Answer(connection_->Commit()), 0);
@@ -589,7 +592,9 @@ TEST_P(SharedContract, RequestEndsAWaitForALock) {
         stop_->Ask();
         connection_->Interrupt();
     });
+    const auto begun = std::chrono::steady_clock::now();
     EXPECT_EQ(Run("update t set n = n + 2"), 1013);
+    EXPECT_LT(std::chrono::steady_clock::now() - begun, 1800ms) << "it was not waited for to the end";
     breaker.join();
     EXPECT_TRUE(stop_->Take());
 }
@@ -628,8 +633,7 @@ TEST_P(Contract, PasswordChangeIsForGood) {
     ASSERT_EQ(LogOn("ann", "secret"), 0);
     ASSERT_EQ(Answer(database_->Connect({"ann", "secret", false}, stop_, connection_)), 0);
     const struct { const char* user; const char* old_password; std::string new_password; int number; } refused[] = {
-        {"ann", "wrong", "new", 28008},
-        {"bob", "secret", "new", 1017},
+        {"ann", "wrong", "new", 28008}, {"bob", "secret", "new", 1017},
         {"ann", "secret", std::string("a\0b", 3), 1017}};
     for (const auto& c : refused) {
         EXPECT_EQ(Answer(connection_->ChangePassword(c.user, c.old_password, c.new_password)), c.number) << c.user;

@@ -58,13 +58,10 @@ protected:
 TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
     MakeTables();
     const struct { const char* sql; const char* text; const char* rows; } cases[] = {
-        {"select id from t where d <= %", "01-JAN-20", "2;"},
-        {"select id from t where % < t.d", "01-JAN-20", "1;"},
+        {"select id from t where d <= %", "01-JAN-20", "2;"}, {"select id from t where % < t.d", "01-JAN-20", "1;"},
         {"select id from t where d not between '01-JAN-00' and %", "31-DEC-20", "1;2;"},
-        {"select id from t where c not in (%)", "ab ", "2;"},
-        {"select id from t where c <> %", "abc     ", "1;"},
-        {"select id from t where n > %", "7", "2;"},
-        {"select id from t where n = %", "x", "!1722"},
+        {"select id from t where c not in (%)", "ab ", "2;"}, {"select id from t where c <> %", "abc     ", "1;"},
+        {"select id from t where n > %", "7", "2;"}, {"select id from t where n = %", "x", "!1722"},
         {"select id from t where (d = % or 1 = 0)", "03-FEB-24", "1;"},
         {"select id from t where substr(c, 1, 2) = %", "ab", "1;2;"},
         {"select id from t where exists(select 1 from u where u.e > % and u.id = t.id)", "02-FEB-24 09.00.00 AM", "1;"},
@@ -82,6 +79,7 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from t where % < add_months(d, 1)", "01-MAR-24", "1;"},
         {"select id from t where nvl(t.d, sysdate) = %", "03-FEB-24", "1;"},
         {"select id from t group by id having max(d) > %", "01-JAN-24", "1;"},
+        {"select id from t group by id having max(d) filter (where 1 = 1) > %", "01-JAN-24", "1;"},
         {"select id from t where sysdate > % and id = 1", "01-JAN-24", "1;"},
         {"select id from t where d > % || '-24'", "01-JAN", "1;"},
         {"select id from t where d > case when id = 1 then % end", "01-JAN-24", "1;"},
@@ -108,12 +106,9 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select t.id from t join u x on t.d = % where x.d = '03-FEB-24'", "03-FEB-24", "1;"},
         {"select id from t where c = % or c = 'it''s'", "ab ", "1;"},
         {"select id from t where c in (select c from t where c = %)", "ab ", "1;"},
-        {"select id from t where v = %", "x", "2;"},
-        {"select id from u where c = %", "ab", ""},
-        {"select id from t where r = %", "0a", "1;"},
-        {"select id from t where r = x'0A' and v > %", "a", "1;"},
-        {"select id from t where n = %", "5.0", "1;"},
-        {"select id from t where d > %", "today", "!1858"},
+        {"select id from t where v = %", "x", "2;"}, {"select id from u where c = %", "ab", ""},
+        {"select id from t where r = %", "0a", "1;"}, {"select id from t where r = x'0A' and v > %", "a", "1;"},
+        {"select id from t where n = %", "5.0", "1;"}, {"select id from t where d > %", "today", "!1858"},
         {"select id from t where d = sysdate - length(%)", "x", "!932"},
         {"select id from t where d = 5 and v > %", "a", "!932"},
     };
@@ -165,8 +160,7 @@ TEST_F(SqliteMeaning, ChangesFindTheRowsThatAQueryFinds) {
 TEST_F(SqliteMeaning, WhatCannotBeComparedRightlyIsRefused) {
     MakeTables();
     const struct { const char* sql; int number; } cases[] = {
-        {"select id from t where c = 'ab' = c", 933},
-        {"select id from t where id < 2 = 1", 933},
+        {"select id from t where c = 'ab' = c", 933}, {"select id from t where id < 2 = 1", 933},
         {"insert into u(id) select id from t where d = '01-JAN-24' = c", 933},
         {"select id from t natural join u where d = '03-FEB-24'", 932},
         {"create view y as select id from t where d > 'today'", 1858},
@@ -223,6 +217,8 @@ TEST_F(SqliteMeaning, ValuesAreMadeToFitWhereverTheyAreStored) {
          "0,2024-02-03 00:00:00,-;"},
         {"update w set (d, c) = ('03-FEB-24', 'ab')", "0,2024-02-03 00:00:00,ab   ;"},
         {"update w set (d, c) = (select '03-FEB-24', 'ab   ')", "0,2024-02-03 00:00:00,ab   ;"},
+        {"update w set (d, c) = (with s as (select '03-FEB-24' as d) select d, 'ab   ' from s)",
+         "0,2024-02-03 00:00:00,ab   ;"},
         {"update w set d = (select '03-FEB-24')", "0,2024-02-03 00:00:00,-;"},
         {"insert into w values(1, '30-FEB-24', 'ab')", "!1839"},
         {"with s as (select 'abcdef' as c) insert into w(id, c) select 1, c from s", "!12899"},
@@ -436,6 +432,19 @@ TEST_F(SqliteMeaning, DefaultsAreExpressions) {
     EXPECT_EQ(Rows("select d || '' as d from u"), "2024-02-09 00:00:00;");
 }
 
+// A statement that is kept goes with its table when that is made anew, in a database in memory, too.
+TEST_F(SqliteMeaning, StatementsFollowTheirTables) {
+    char day[] = "03-FEB-24";
+    StatementCalls insert = Another();
+    ASSERT_EQ(insert.Ready("insert into w values(:1)", {Text(day)}), 0);
+    for (const char* type : {"varchar2(20)", "date", "varchar2(20)"}) {
+        MustRun("create table w(d " + std::string(type) + ")");
+        ASSERT_EQ(insert.Execute(), 0);
+        EXPECT_EQ(Rows("select d || '' as d from w"), type[0] == 'd' ? "2024-02-03 00:00:00;" : "03-FEB-24;");
+        MustRun("drop table w");
+    }
+}
+
 TEST_F(SqliteMeaning, OnlyStatementsOfApplicationsReachTheEngine) {
     MustRun("create table t(a number)");
     for (const char* sql : {"end", "end transaction", "vacuum", "attach ':memory:' as other", "detach main", "reindex",
@@ -465,8 +474,7 @@ TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
         {"to_char(months_between(date '2024-03-30', date '2024-02-29'), '9.999999')", " 1.032258"},
         {"initcap('1st 2ND o''neil')", "1st 2nd O'Neil"},
         {"instr('abc', 'a', -3)", "1"}, {"instr('abc', 'a', -4)", "0"}, {"instr('abc', 'c', 3)", "3"},
-        {"instr('abc', 'c', 4)", "0"},
-        {"'[' || decode(cast('   ' as char(3)), '   ', 'same') || ']'", "[same]"},
+        {"instr('abc', 'c', 4)", "0"}, {"'[' || decode(cast('   ' as char(3)), '   ', 'same') || ']'", "[same]"},
     };
     for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.value) << c.expression;
     MustRun("create table t(c char(3))");

@@ -10,6 +10,7 @@
 #include <thread>
 
 #include "engine/engine_fixture.h"
+#include "engine/sqlite/errors.h"
 
 namespace {
 
@@ -38,7 +39,12 @@ TEST_F(Sqlite, NumbersKeepEveryDigit) {
 TEST_F(Sqlite, LongLiteralsKeepEveryDigit) {
     ASSERT_EQ(Run("create table t(n number)"), 0);
     ASSERT_EQ(Run("insert into t values(-123456789012345678901234567890.5), (1), (12345678901234567890)"), 0);
-    EXPECT_EQ(Query("select n from t"), "decimal -123456789012345678901234567890.5;1;decimal 12345678901234567890;");
+    const char* const rows = "decimal -123456789012345678901234567890.5;1;decimal 12345678901234567890;";
+    EXPECT_EQ(Query("select n from t"), rows);
+    ASSERT_EQ(Run("create table u(r raw(30))"), 0);
+    const std::string_view bytes("\0N\xC0\x80\xCA\x0D\x23\x39\x4F\x5B\x0D\x23\x39\x4F\x5B", 15);
+    ASSERT_EQ(Run("insert into u values(?1)", {View(Kind::bytes, bytes)}), 0);
+    EXPECT_EQ(Query("select r from u"), "bytes 15;") << "whatever they look like";
 }
 
 TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
@@ -54,44 +60,26 @@ TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
 TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
     ASSERT_EQ(
         Run("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
-            "s timestamp, r raw(2), x kelp_decfloat(16), b clob)"),
+            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18))"),
         0);
     const struct { const char* column; const char* literal; const char* outcome;
     } cases[] = {{"n", "'12.345'", "real 12.35"},
-                 {"n", "999.99", "real 999.99"},
-                 {"n", "999.995", "error 1438"},
-                 {"n", "-1000", "error 1438"},
-                 {"n", "'abc'", "error 1722"},
-                 {"n", "x'01'", "error 932"},
-                 {"n", "7", "7"},
-                 {"n", "''", "null"},
-                 {"n", "1.005e2", "real 100.5"},
-                 {"w", "12345", "12300"},
-                 {"w", "99950", "error 1438"},
-                 {"i", "2.5", "3"},
-                 {"i", "' 12 '", "12"},
+                 {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"}, {"n", "-1000", "error 1438"},
+                 {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"}, {"n", "''", "null"},
+                 {"n", "1.005e2", "real 100.5"}, {"w", "12345", "12300"}, {"w", "99950", "error 1438"},
+                 {"i", "2.5", "3"}, {"i", "' 12 '", "12"},
                  {"f", "'123456789012345678901234567890.5'", "decimal 123456789012345678901234567890.5"},
-                 {"f", "1e300", "error 1426"},
-                 {"v", "'abc'", "abc"},
-                 {"v", "'abcd'", "error 12899"},
-                 {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"},
-                 {"v", "12", "12"},
-                 {"c", "'ab  '", "ab  "},
-                 {"c", "'abcde'", "error 12899"},
-                 {"c", "'abcd   '", "abcd"},
-                 {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"},
-                 {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"},
-                 {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"},
-                 {"d", "'30-FEB-24'", "error 1839"},
-                 {"d", "'x'", "error 1858"},
-                 {"d", "5", "error 932"},
-                 {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"},
-                 {"r", "'0aFF'", "bytes 2"},
-                 {"r", "'0aFF00'", "error 12899"},
-                 {"r", "'0g'", "error 1465"},
-                 {"r", "x'0102'", "bytes 2"},
+                 {"f", "1e300", "error 1426"}, {"v", "'abc'", "abc"}, {"v", "'abcd'", "error 12899"},
+                 {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"}, {"v", "12", "12"}, {"c", "'ab  '", "ab  "},
+                 {"c", "'abcde'", "error 12899"}, {"c", "'abcd   '", "abcd"},
+                 {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"}, {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"},
+                 {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"}, {"d", "'30-FEB-24'", "error 1839"},
+                 {"d", "'x'", "error 1858"}, {"d", "5", "error 932"},
+                 {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"}, {"r", "'0aFF'", "bytes 2"},
+                 {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 2"},
                  {"x", "'1.23456789012345678'", "decimal 1.234567890123457"},
-                 {"b", "'any text at all'", "any text at all"},
+                 {"b", "'any text at all'", "any text at all"}, {"e", "-999999999999999999", "-999999999999999999"},
+                 {"e", "1000000000000000000", "error 1438"},
                  {"n", "null", "null"}};
     for (const auto& c : cases) {
         const std::string column = c.column;
@@ -123,14 +111,10 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
 // columns are when it runs.
 TEST_F(Sqlite, StatementsFollowTablesMadeAnew) {
     const struct { const char* type; const char* value; int stored; int found; const char* rows; } cases[] = {
-        {"varchar2(20)", "05-FEB-24", 0, 0, "05-FEB-24;"},
-        {"date", "05-FEB-24", 0, 0, "2024-02-05 00:00:00;"},
-        {"varchar2(20)", "no date", 0, 0, "no date;"},
-        {"number(5,1)", "1.5", 0, 0, "1.5;"},
-        {"number(5,1)", "99999.9", 1438, 0, ""},
-        {"date", "05-XXX-24", 1843, 1843, ""},
-        {"raw(4)", "0a0b", 0, 0, "\n\v;"},
-        {"date", "06-FEB-24", 0, 0, "2024-02-06 00:00:00;"},
+        {"varchar2(20)", "05-FEB-24", 0, 0, "05-FEB-24;"}, {"date", "05-FEB-24", 0, 0, "2024-02-05 00:00:00;"},
+        {"varchar2(20)", "no date", 0, 0, "no date;"}, {"number(5,1)", "1.5", 0, 0, "1.5;"},
+        {"number(5,1)", "99999.9", 1438, 0, ""}, {"date", "05-XXX-24", 1843, 1843, ""},
+        {"raw(4)", "0a0b", 0, 0, "\n\v;"}, {"date", "06-FEB-24", 0, 0, "2024-02-06 00:00:00;"},
     };
     const auto other = Connect();
     for (engine::Connection* maker : {connection_.get(), other.get()}) {
@@ -177,18 +161,12 @@ TEST_F(Sqlite, ColumnsAreDescribed) {
                                "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', count(kelp_date(b )) from t");
     struct Expected { const char* name; int type; unsigned size; int precision; int scale; bool nullable; };
     const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false},
-                                 {"Mixed", SQLT_CHR, 20, 0, 0, true},
-                                 {"C", SQLT_AFC, 5, 0, 0, true},
-                                 {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true},
-                                 {"E", SQLT_NUM, 22, 0, -127, true},
-                                 {"F", SQLT_CLOB, 4000, 0, 0, true},
-                                 {"G", SQLT_CHR, 0, 0, 0, true},
-                                 {"ID", SQLT_NUM, 22, 38, 0, false},
-                                 {"H", SQLT_BDOUBLE, 16, 34, -127, true},
-                                 {"I", SQLT_NUM, 22, 5, 0, true},
-                                 {"1+1", SQLT_NUM, 22, 0, -127, true},
-                                 {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true},
-                                 {"ROWID", SQLT_RDD, 18, 0, 0, false},
+                                 {"Mixed", SQLT_CHR, 20, 0, 0, true}, {"C", SQLT_AFC, 5, 0, 0, true},
+                                 {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true}, {"E", SQLT_NUM, 22, 0, -127, true},
+                                 {"F", SQLT_CLOB, 4000, 0, 0, true}, {"G", SQLT_CHR, 0, 0, 0, true},
+                                 {"ID", SQLT_NUM, 22, 38, 0, false}, {"H", SQLT_BDOUBLE, 16, 34, -127, true},
+                                 {"I", SQLT_NUM, 22, 5, 0, true}, {"1+1", SQLT_NUM, 22, 0, -127, true},
+                                 {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true}, {"ROWID", SQLT_RDD, 18, 0, 0, false},
                                  {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
                                  {"COUNT(CAST(B AS DATE))", SQLT_NUM, 22, 0, -127, true}};
     const auto& columns = query->Columns();
@@ -209,9 +187,9 @@ TEST_F(Sqlite, CastsKeepDigitsAndDates) {
     const struct { const char* sql; const char* rows; } cases[] = {
         {"values(kelp_varchar(kelp_decfloat(?1, 34), 100))", "3.141592653589793238462643383279503;"},
         {"values(kelp_varchar(kelp_decfloat(?1, 16), 100))", "3.141592653589793;"},
-        {"values(kelp_number(?1, 5, 2))", "real 3.14;"},
-        {"values(kelp_number(?1, 2, 2))", "error 1438"},
-        {"select kelp_number('x' || ?1)", "error 1722"},
+        {"values(kelp_number(?1, 5, 2))", "real 3.14;"}, {"values(kelp_number(?1, 5))", "3;"},
+        {"select kelp_date('2024-02-29 13:14:15.5 +01:00'), substr(?1, 1, 0)", "time 2024-02-29 13:14:15,null;"},
+        {"values(kelp_number(?1, 2, 2))", "error 1438"}, {"select kelp_number('x' || ?1)", "error 1722"},
         {"select kelp_varchar('äöü' || ifnull(substr(?1, 1, 0), ''), 2), kelp_char('a', 3)", "ä,a  ;"},
         {"select kelp_date('2024-02-30'), ?1", "error 1839"},
         {"select kelp_date('2024-02-29T13:14:15.5'), substr(?1, 1, 0)", "time 2024-02-29 13:14:15,null;"}};
@@ -250,12 +228,13 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
          "1901-01-01 00:00:00;"},
         {"trunc('2024-08-15', 'xx')", "error 1898"},
         {"hextoraw('abc'), rawtohex(x'0aff'), rawtohex('A')", "bytes 2,0AFF,41;"}, {"hextoraw('0g')", "error 1465"},
+        {"rawtohex(5)", "error 932"}, {"lpad('x', 1e19)", "error 1426"},
+        {"months_between('2024-03-10 12:00:00', '2024-02-09')", "decimal 1.0483870967741935483870967741935483871;"},
         {"decode(2, 1, 'a', 2, 'b'), decode(null, 1, 'a', null, 'n'), decode(3, 1, 'a'), decode(3, 1, 'a', 'else'),"
          " decode('1', 1, 'same')", "b,n,null,else,same;"},
         {"decode('x', 1, 'a')", "error 1722"}, {"decode(1, 2)", "error 938"},
         {"greatest(1, 10, 9), least('b', 'a', 'c'), greatest(1, null), least(0.5)", "10,a,null,real 0.5;"},
-        {"greatest()", "error 938"},
-        {"initcap('the QUICK-fox o''neil äB')", "The Quick-Fox O'Neil äb;"},
+        {"greatest()", "error 938"}, {"initcap('the QUICK-fox o''neil äB')", "The Quick-Fox O'Neil äb;"},
         {"lpad('ä', 4, 'xö'), rpad('abc', 2), lpad('x', 0), rpad(5, 3, '*'), lpad('x', 3, '')",
          "xöxä,ab,null,5**,null;"},
         {"instr('banana', 'an'), instr('banana', 'an', 1, 2), instr('banana', 'an', -1), instr('banana', 'an', -1, 2),"
@@ -528,6 +507,28 @@ TEST_F(Sqlite, FileThatCannotBeWrittenIsRead) {
     for (const char* end : {"-wal", "-shm"}) fs::remove(file + end);
     ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
     EXPECT_EQ(AsNobody(look), 0) << "the folder";
+    std::ofstream(file + "-wal") << "what a writer has left";
+    EXPECT_EQ(AsNobody(look), geteuid() == 0 ? 1 : 0) << "what lies in the log cannot be seen";
+}
+
+TEST_F(Sqlite, OnlyWhoOwnsTheFileNeedsNoPassword) {
+    ASSERT_EQ(LogOn("ann", "secret"), 0);
+    connection_ = Connect();
+    connection_.reset();
+    database_.reset();
+    const std::string file = folder_ + "/test.db";
+    ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
+    const auto look = [&] {
+        if (engine::Open(file, database_).Failed()) return 1;
+        return Answer(database_->Connect({"", "", true}, stop_, connection_)) == 1017 ? 0 : 2;
+    };
+    EXPECT_EQ(geteuid() == 0 ? AsNobody(look) : 0, 0) << "needs another user, as root may become";
+}
+
+TEST_F(Sqlite, ALostTransactionIsToldOnce) {
+    const Status once = engine::sqlite::RolledBack(Error(1653, "full"));
+    EXPECT_EQ(once.Detail(), "full; the transaction was rolled back");
+    EXPECT_EQ(engine::sqlite::RolledBack(once).Detail(), once.Detail());
 }
 
 // Pages that lie in an unwritable file may be of two times once somebody else has written it: no answer then.

@@ -147,14 +147,10 @@ void PiecesOut(World& w) {
             dvoid* handle = nullptr;
             ub4 type = 0, iteration = 0, index = 0;
             ub1 direction = 0, piece = 0;
-            w.Step("OCIStmtGetPieceInfo", [&] {
-                return OCIStmtGetPieceInfo(w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
-            });
+            w.STEP(OCIStmtGetPieceInfo, w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
             char buffer[5];
             ub4 length = sizeof buffer;
-            w.Step("OCIStmtSetPieceInfo", [&] {
-                return OCIStmtSetPieceInfo(handle, type, w.err, buffer, &length, piece, nullptr, nullptr);
-            });
+            w.STEP(OCIStmtSetPieceInfo, handle, type, w.err, buffer, &length, piece, nullptr, nullptr);
             code = w.Fetch();
             value.append(buffer, length);
         }
@@ -237,15 +233,10 @@ void InUtf16(World& w) {
     const std::u16string_view in = u"ÄÖÜ and more that is not short";
     char16_t out[80] = u"";
     ub2 length = 0;
-    w.Step("OCIStmtPrepare", [&] {
-        return OCIStmtPrepare(w.stmt, w.err, bytes(sql), static_cast<ub4>(sql.size() * 2), OCI_NTV_SYNTAX, OCI_DEFAULT);
-    });
+    w.STEP(OCIStmtPrepare, w.stmt, w.err, bytes(sql), static_cast<ub4>(sql.size() * 2), OCI_NTV_SYNTAX, OCI_DEFAULT);
     OCIBind* bind = nullptr;
-    w.Step("OCIBindByName", [&] {
-        return OCIBindByName(w.stmt, &bind, w.err, bytes(u":x"), 4, const_cast<char16_t*>(in.data()),
-                             static_cast<sb4>(in.size() * 2), SQLT_CHR, nullptr, nullptr, nullptr, 0, nullptr,
-                             OCI_DEFAULT);
-    });
+    w.STEP(OCIBindByName, w.stmt, &bind, w.err, bytes(u":x"), 4, const_cast<char16_t*>(in.data()),
+           static_cast<sb4>(in.size() * 2), SQLT_CHR, nullptr, nullptr, nullptr, 0, nullptr, OCI_DEFAULT);
     w.Define(1, {out, sizeof out, SQLT_CHR, nullptr, &length});
     w.Execute(1);
     w.See(length);

@@ -26,11 +26,9 @@ void CreateEnvironment(World& w) {
 }
 
 void LogOn(World& w, std::string_view user, std::string_view password, std::string_view database) {
-    w.Step("OCILogon", [&] {
-        return OCILogon(w.env, w.err, &w.svc, user.empty() ? nullptr : World::Text(user), World::Size(user),
-                        user.empty() ? nullptr : World::Text(password), World::Size(password), World::Text(database),
-                        World::Size(database));
-    });
+    w.STEP(OCILogon, w.env, w.err, &w.svc, user.empty() ? nullptr : World::Text(user), World::Size(user),
+           user.empty() ? nullptr : World::Text(password), World::Size(password), World::Text(database),
+           World::Size(database));
     w.AtEnd([&w] { return OCILogoff(std::exchange(w.svc, nullptr), w.err); });
 }
 
@@ -54,13 +52,10 @@ void InitializeAndLogOn2(World& w) {
     w.AtEnd([] { return OCITerminate(OCI_DEFAULT); });
     w.Step("OCIEnvInit", [&] { return OCIEnvInit(&w.env, OCI_DEFAULT, 16, nullptr); }, Told::code);
     OwnEnvironment(w);
-    w.Step("OCILogon2", [&] {
-        return OCILogon2(w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8,
-                         OCI_LOGON2_STMTCACHE);
-    });
+    w.STEP(OCILogon2, w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8, OCI_LOGON2_STMTCACHE);
     w.AtEnd([&w] { return OCILogoff(std::exchange(w.svc, nullptr), w.err); });
-    w.Step("OCIBreak", [&] { return OCIBreak(w.svc, w.err); });
-    w.Step("OCIReset", [&] { return OCIReset(w.svc, w.err); });
+    w.STEP(OCIBreak, w.svc, w.err);
+    w.STEP(OCIReset, w.svc, w.err);
     w.See(w.Attribute<ub4>(OCI_ATTR_STMTCACHESIZE, w.svc, OCI_HTYPE_SVCCTX));
 }
 
@@ -83,9 +78,9 @@ void FreeingTakesNoMemory(World& w) {
         OCIStmtPrepare(query, error, World::Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT);
         EXPECT_EQ(OCIStmtExecute(svc, query, error, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
     }).join();
-    w.Surely("OCIDescriptorFree", [&] { return OCIDescriptorFree(descriptor, OCI_DTYPE_TIMESTAMP); });
+    w.SURELY(OCIDescriptorFree, descriptor, OCI_DTYPE_TIMESTAMP);
     w.Surely("OCIHandleFree of a statement", [&] { return OCIHandleFree(stmt, OCI_HTYPE_STMT); });
-    w.Surely("OCILogoff", [&] { return OCILogoff(svc, static_cast<OCIError*>(err)); });
+    w.SURELY(OCILogoff, svc, static_cast<OCIError*>(err));
     w.Surely("OCIHandleFree of the environment", [&] { return OCIHandleFree(env, OCI_HTYPE_ENV); });
     w.See("freed");
 }
@@ -123,19 +118,17 @@ void AttachAndBegin(World& w) {
         {svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION},
     };
     for (const auto& s : set) {
-        w.Step("OCIAttrSet", [&] { return OCIAttrSet(s.on, s.type, s.value, s.size, s.attribute, w.err); });
+        w.STEP(OCIAttrSet, s.on, s.type, s.value, s.size, s.attribute, w.err);
     }
-    w.Step("OCISessionBegin", [&] { return OCISessionBegin(svc, w.err, session, OCI_CRED_EXT, OCI_DEFAULT); });
+    w.STEP(OCISessionBegin, svc, w.err, session, OCI_CRED_EXT, OCI_DEFAULT);
     w.AtEnd([&w, svc, session] { return OCISessionEnd(svc, w.err, session, OCI_DEFAULT); });
     OraText* name = nullptr;
     ub4 length = 0;
-    w.Step("OCIAttrGet", [&] {
-        return OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &length, OCI_ATTR_USERNAME, w.err);
-    });
+    w.STEP(OCIAttrGet, session, OCI_HTYPE_SESSION, &name, &length, OCI_ATTR_USERNAME, w.err);
     w.See(length);
-    w.Step("OCIPing", [&] { return OCIPing(svc, w.err, OCI_DEFAULT); });
+    w.STEP(OCIPing, svc, w.err, OCI_DEFAULT);
     OraText version[200];
-    w.Step("OCIServerVersion", [&] { return OCIServerVersion(svc, w.err, version, sizeof version, OCI_HTYPE_SVCCTX); });
+    w.STEP(OCIServerVersion, svc, w.err, version, sizeof version, OCI_HTYPE_SVCCTX);
     w.See(version[0] != 0 ? "version" : "");
 }
 
@@ -220,7 +213,7 @@ void LogoffCommits(World& w) {
     EXPECT_EQ(OCIStmtExecute(svc, query, w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
     bool failed = false;
     try {
-        w.Step("OCILogoff", [&] { return OCILogoff(svc, w.err); });
+        w.STEP(OCILogoff, svc, w.err);
     } catch (const Stopped&) {
         failed = true;
         EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS) << "again";

@@ -16,19 +16,15 @@ namespace {
 OCINumber Number(World& w, std::string_view text, std::string format = {}) {
     OCINumber number{};
     if (format.empty()) format.assign(text.size(), '9');
-    w.Step("OCINumberFromText", [&] {
-        return OCINumberFromText(w.err, World::Text(text), World::Size(text), World::Text(format), World::Size(format),
-                                 nullptr, 0, &number);
-    });
+    w.STEP(OCINumberFromText, w.err, World::Text(text), World::Size(text), World::Text(format), World::Size(format),
+           nullptr, 0, &number);
     return number;
 }
 
 void SeeNumber(World& w, const OCINumber& number) {
     OraText text[60] = "";
     ub4 size = sizeof text;
-    w.Step("OCINumberToText", [&] {
-        return OCINumberToText(w.err, &number, World::Text("S99.999999EEEE"), 14, nullptr, 0, &size, text);
-    });
+    w.STEP(OCINumberToText, w.err, &number, World::Text("S99.999999EEEE"), 14, nullptr, 0, &size, text);
     w.See({reinterpret_cast<char*>(text), size});
 }
 
@@ -57,42 +53,38 @@ void NumberFunctions(World& w) {
     const OCINumber huge = Number(w, "9.876E125", "9.999EEEE"), root = Number(w, "3.00000000000000000005"),
                     two = Number(w, "2"), tiny = Number(w, "5E-39", "9EEEE");
     OCINumber result{};
-    w.Step("OCINumberSin", [&] { return OCINumberSin(w.err, &huge, &result); });
+    w.STEP(OCINumberSin, w.err, &huge, &result);
     SeeNumber(w, result);
-    w.Step("OCINumberPower", [&] { return OCINumberPower(w.err, &root, &two, &result); });
+    w.STEP(OCINumberPower, w.err, &root, &two, &result);
     SeeNumber(w, result);
-    w.Step("OCINumberExp", [&] { return OCINumberExp(w.err, &tiny, &result); });
+    w.STEP(OCINumberExp, w.err, &tiny, &result);
     SeeNumber(w, result);
     using Binary = sword (*)(OCIError*, const OCINumber*, const OCINumber*, OCINumber*);
     for (const Binary function : {OCINumberPower, OCINumberLog, OCINumberArcTan2}) {
         w.Step("a number function", [&] { return function(w.err, &large, &exponent, &result); });
         SeeNumber(w, result);
     }
-    w.Step("OCINumberIntPower", [&] { return OCINumberIntPower(w.err, &large, 17, &result); });
+    w.STEP(OCINumberIntPower, w.err, &large, 17, &result);
     SeeNumber(w, result);
 }
 
 void NumberForms(World& w) {
     const double real = 1234.0625;
     OCINumber number{};
-    w.Step("OCINumberFromReal", [&] { return OCINumberFromReal(w.err, &real, sizeof real, &number); });
+    w.STEP(OCINumberFromReal, w.err, &real, sizeof real, &number);
     long double back = 0;
-    w.Step("OCINumberToReal", [&] { return OCINumberToReal(w.err, &number, sizeof back, &back); });
+    w.STEP(OCINumberToReal, w.err, &number, sizeof back, &back);
     w.See(static_cast<long>(back * 10000));
-    w.Step("OCINumberFromReal", [&] { return OCINumberFromReal(w.err, &back, sizeof back, &number); });
+    w.STEP(OCINumberFromReal, w.err, &back, sizeof back, &number);
     OCINumber amount{};
-    w.Step("OCINumberFromText", [&] {
-        return OCINumberFromText(w.err, World::Text("$1,234.5"), 8, World::Text("$9,999.9"), 8, nullptr, 0, &amount);
-    });
+    w.STEP(OCINumberFromText, w.err, World::Text("$1,234.5"), 8, World::Text("$9,999.9"), 8, nullptr, 0, &amount);
     SeeNumber(w, amount);
     for (const std::string_view format : {"L9G999D99", "TM9", "RN", "9.9EEEE", "FM0000V99", "XXXXXX"}) {
         OraText text[80] = "";
         ub4 size = sizeof text;
         constexpr std::string_view kSettings = "NLS_NUMERIC_CHARACTERS=',.' NLS_CURRENCY='EUR'";
-        w.Step("OCINumberToText", [&] {
-            return OCINumberToText(w.err, &number, World::Text(format), World::Size(format), World::Text(kSettings),
-                                   World::Size(kSettings), &size, text);
-        });
+        w.STEP(OCINumberToText, w.err, &number, World::Text(format), World::Size(format), World::Text(kSettings),
+               World::Size(kSettings), &size, text);
         w.See({reinterpret_cast<char*>(text), size});
     }
 }
@@ -101,27 +93,20 @@ void NumberForms(World& w) {
 
 void Dates(World& w) {
     OCIDate date{};
-    w.Step("OCIDateFromText", [&] {
-        return OCIDateFromText(w.err, World::Text("Friday 29 FEBRUARY 2008 11:12:13"), 32,
-                               World::Text("DAY DD MONTH YYYY HH24:MI:SS"), 28, nullptr, 0, &date);
-    });
-    w.Step("OCIDateNextDay", [&] { return OCIDateNextDay(w.err, &date, World::Text("MONDAY"), 6, &date); });
-    w.Step("OCIDateAddMonths", [&] { return OCIDateAddMonths(w.err, &date, 11, &date); });
+    w.STEP(OCIDateFromText, w.err, World::Text("Friday 29 FEBRUARY 2008 11:12:13"), 32,
+           World::Text("DAY DD MONTH YYYY HH24:MI:SS"), 28, nullptr, 0, &date);
+    w.STEP(OCIDateNextDay, w.err, &date, World::Text("MONDAY"), 6, &date);
+    w.STEP(OCIDateAddMonths, w.err, &date, 11, &date);
     OCIDate now{}, this_century{};
-    w.Step("OCIDateSysDate", [&] { return OCIDateSysDate(w.err, &now); });
+    w.STEP(OCIDateSysDate, w.err, &now);
     EXPECT_GT(now.OCIDateYYYY, 2000);
-    w.Step("OCIDateFromText", [&] {
-        return OCIDateFromText(w.err, World::Text("29-FEB-24"), 9, World::Text("DD-MON-RR"), 9, nullptr, 0,
-                               &this_century);
-    });
+    w.STEP(OCIDateFromText, w.err, World::Text("29-FEB-24"), 9, World::Text("DD-MON-RR"), 9, nullptr, 0, &this_century);
     w.See(this_century.OCIDateYYYY);
     OraText text[200] = "";
     ub4 size = sizeof text;
     constexpr std::string_view kFormat = "FMDay, DDTH \"of the month of\" Month YYYY, JSP, HH:MI:SS AM";
-    w.Step("OCIDateToText", [&] {
-        return OCIDateToText(w.err, &date, World::Text(kFormat), static_cast<ub1>(kFormat.size()),
-                             World::Text("FRENCH"), 6, &size, text);
-    });
+    w.STEP(OCIDateToText, w.err, &date, World::Text(kFormat), static_cast<ub1>(kFormat.size()), World::Text("FRENCH"),
+           6, &size, text);
     w.See({reinterpret_cast<char*>(text), size});
 }
 
@@ -150,15 +135,13 @@ void Datetimes(World& w) {
     w.Step("OCIDateTimeConstruct", [&] { return construct(there, zone); });
     w.Step("OCIDateTimeConstruct", [&] { return construct(here, "-12:00"); });
     sword order = 0;
-    w.Step("OCIDateTimeCompare", [&] { return OCIDateTimeCompare(w.env, w.err, there, here, &order); });
+    w.STEP(OCIDateTimeCompare, w.env, w.err, there, here, &order);
     w.See(order);
     w.Step("OCIDateTimeConstruct", [&] { return construct(here, ""); });
-    w.Step("OCIDateTimeAssign", [&] { return OCIDateTimeAssign(w.env, w.err, there, here); });
+    w.STEP(OCIDateTimeAssign, w.env, w.err, there, here);
     ub1 hour = 0, minute = 0, second = 0;
     ub4 fraction = 0;
-    w.Step("OCIDateTimeGetTime", [&] {
-        return OCIDateTimeGetTime(w.env, w.err, here, &hour, &minute, &second, &fraction);
-    });
+    w.STEP(OCIDateTimeGetTime, w.env, w.err, here, &hour, &minute, &second, &fraction);
     w.See(hour);
 }
 
@@ -168,25 +151,20 @@ void ZoneOfTheProcess(World& w) {
     auto* plain = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
     auto* local = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_LTZ);
     const auto construct = [&](OCIDateTime* value, std::string_view zone) {
-        w.Step("OCIDateTimeConstruct", [&] {
-            return OCIDateTimeConstruct(w.env, w.err, value, 2024, 7, 15, 13, 14, 15, 5, World::Text(zone),
-                                        zone.size());
-        });
+        w.STEP(OCIDateTimeConstruct, w.env, w.err, value, 2024, 7, 15, 13, 14, 15, 5, World::Text(zone), zone.size());
     };
     OCIDate now{};
     sword order = 0;
     ub1 hour = 0, minute = 0, second = 0;
     ub4 fraction = 0;
-    w.Step("OCIDateSysDate", [&] { return OCIDateSysDate(w.err, &now); });
+    w.STEP(OCIDateSysDate, w.err, &now);
     construct(plain, "");
     construct(zoned, "+05:30");
-    w.Step("OCIDateTimeCompare", [&] { return OCIDateTimeCompare(w.env, w.err, plain, zoned, &order); });
+    w.STEP(OCIDateTimeCompare, w.env, w.err, plain, zoned, &order);
     w.See(order);
-    w.Step("OCIDateTimeAssign", [&] { return OCIDateTimeAssign(w.env, w.err, zoned, local); });
-    w.Step("OCIDateTimeAssign", [&] { return OCIDateTimeAssign(w.env, w.err, plain, zoned); });
-    w.Step("OCIDateTimeGetTime", [&] {
-        return OCIDateTimeGetTime(w.env, w.err, zoned, &hour, &minute, &second, &fraction);
-    });
+    w.STEP(OCIDateTimeAssign, w.env, w.err, zoned, local);
+    w.STEP(OCIDateTimeAssign, w.env, w.err, plain, zoned);
+    w.STEP(OCIDateTimeGetTime, w.env, w.err, zoned, &hour, &minute, &second, &fraction);
     w.See(hour);
 }
 
@@ -210,12 +188,12 @@ void Strings(World& w) {
     w.Step("OCIStringAssignText", [&] { return assign("hello"); });
     try {
         w.Step("OCIStringAssignText", [&] { return assign("a text that is too long for the room of the first"); });
-        w.Step("OCIStringResize", [&] { return OCIStringResize(w.env, w.err, 1000, &string); });
+        w.STEP(OCIStringResize, w.env, w.err, 1000, &string);
     } catch (const Stopped&) {
         EXPECT_TRUE(contents(string) == "hello" || contents(string).size() == 49) << contents(string);
         throw;
     }
-    w.Step("OCIStringAssign", [&] { return OCIStringAssign(w.env, w.err, string, &copy); });
+    w.STEP(OCIStringAssign, w.env, w.err, string, &copy);
     w.See(contents(copy));
 }
 
@@ -227,15 +205,15 @@ void Raws(World& w) {
         return raw ? OCIRawResize(w.env, w.err, 0, &raw) : code;
     });
     const ub1 bytes[100] = {1, 2, 3};
-    w.Step("OCIRawAssignBytes", [&] { return OCIRawAssignBytes(w.env, w.err, bytes, 3, &raw); });
+    w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 3, &raw);
     try {
-        w.Step("OCIRawAssignBytes", [&] { return OCIRawAssignBytes(w.env, w.err, bytes, 100, &raw); });
-        w.Step("OCIRawResize", [&] { return OCIRawResize(w.env, w.err, 2000, &raw); });
+        w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 100, &raw);
+        w.STEP(OCIRawResize, w.env, w.err, 2000, &raw);
     } catch (const Stopped&) {
         EXPECT_EQ(OCIRawPtr(w.env, raw)[2], 3);
         throw;
     }
-    w.Step("OCIRawAssignRaw", [&] { return OCIRawAssignRaw(w.env, w.err, raw, &copy); });
+    w.STEP(OCIRawAssignRaw, w.env, w.err, raw, &copy);
     w.See(OCIRawSize(w.env, copy));
 }
 
@@ -243,16 +221,14 @@ void Raws(World& w) {
 
 void Files(World& w) {
     const std::string folder = w.Folder();
-    w.Step("OCIFileInit", [&] { return OCIFileInit(w.env, w.err); });
+    w.STEP(OCIFileInit, w.env, w.err);
     w.AtEnd([&w] { return OCIFileTerm(w.env, w.err); });
     const std::string path = folder + "/a file with a long name";
     std::ofstream(path) << "what was there";
     OCIFileObject* file = nullptr;
     const auto open = [&](ub4 create) {
-        w.Step("OCIFileOpen", [&] {
-            return OCIFileOpen(w.env, w.err, &file, World::Text("a file with a long name"), World::Text(folder),
-                               OCI_FILE_READ_WRITE, create, OCI_FILE_BIN);
-        });
+        w.STEP(OCIFileOpen, w.env, w.err, &file, World::Text("a file with a long name"), World::Text(folder),
+               OCI_FILE_READ_WRITE, create, OCI_FILE_BIN);
         w.AtEnd([&w, file] { return OCIFileClose(w.env, w.err, file); });
     };
     try {
@@ -271,22 +247,16 @@ void Files(World& w) {
     static char data[20000];
     std::memset(data, 'x', sizeof data);
     ub4 count = 0;
-    w.Step("OCIFileWrite", [&] { return OCIFileWrite(w.env, w.err, file, data, sizeof data, &count); });
+    w.STEP(OCIFileWrite, w.env, w.err, file, data, sizeof data, &count);
     w.See(count);
-    w.Step("OCIFileFlush", [&] { return OCIFileFlush(w.env, w.err, file); });
-    w.Step("OCIFileSeek", [&] {
-        return OCIFileSeek(w.env, w.err, file, OCI_FILE_SEEK_BEGINNING, 19990, OCI_FILE_FORWARD);
-    });
-    w.Step("OCIFileRead", [&] { return OCIFileRead(w.env, w.err, file, data, sizeof data, &count); });
+    w.STEP(OCIFileFlush, w.env, w.err, file);
+    w.STEP(OCIFileSeek, w.env, w.err, file, OCI_FILE_SEEK_BEGINNING, 19990, OCI_FILE_FORWARD);
+    w.STEP(OCIFileRead, w.env, w.err, file, data, sizeof data, &count);
     w.See(count);
     ubig_ora length = 0;
     ub1 there = 0;
-    w.Step("OCIFileGetLength", [&] {
-        return OCIFileGetLength(w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &length);
-    });
-    w.Step("OCIFileExists", [&] {
-        return OCIFileExists(w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &there);
-    });
+    w.STEP(OCIFileGetLength, w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &length);
+    w.STEP(OCIFileExists, w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &there);
     w.See(static_cast<long>(length) + there);
 }
 
@@ -299,22 +269,22 @@ void Threads(World& w) {
         OCIThreadProcessInit();
         return OCI_SUCCESS;
     });
-    w.Step("OCIThreadInit", [&] { return OCIThreadInit(w.env, w.err); });
+    w.STEP(OCIThreadInit, w.env, w.err);
     w.AtEnd([&w] { return OCIThreadTerm(w.env, w.err); });
-    w.Step("OCIThreadMutexInit", [&] { return OCIThreadMutexInit(w.env, w.err, &mutex); });
+    w.STEP(OCIThreadMutexInit, w.env, w.err, &mutex);
     w.AtEnd([&w] { return OCIThreadMutexDestroy(w.env, w.err, &mutex); });
-    w.Step("OCIThreadMutexAcquire", [&] { return OCIThreadMutexAcquire(w.env, w.err, mutex); });
-    w.Surely("OCIThreadMutexRelease", [&] { return OCIThreadMutexRelease(w.env, w.err, mutex); });
-    w.Step("OCIThreadKeyInit", [&] { return OCIThreadKeyInit(w.env, w.err, &key, nullptr); });
+    w.STEP(OCIThreadMutexAcquire, w.env, w.err, mutex);
+    w.SURELY(OCIThreadMutexRelease, w.env, w.err, mutex);
+    w.STEP(OCIThreadKeyInit, w.env, w.err, &key, nullptr);
     w.AtEnd([&w] { return OCIThreadKeyDestroy(w.env, w.err, &key); });
-    w.Step("OCIThreadKeySet", [&] { return OCIThreadKeySet(w.env, w.err, key, &w); });
+    w.STEP(OCIThreadKeySet, w.env, w.err, key, &w);
     dvoid* value = nullptr;
-    w.Step("OCIThreadKeyGet", [&] { return OCIThreadKeyGet(w.env, w.err, key, &value); });
+    w.STEP(OCIThreadKeyGet, w.env, w.err, key, &value);
     w.See(value == &w);
-    w.Step("OCIThreadIdInit", [&] { return OCIThreadIdInit(w.env, w.err, &id); });
+    w.STEP(OCIThreadIdInit, w.env, w.err, &id);
     w.AtEnd([&w] { return OCIThreadIdDestroy(w.env, w.err, &id); });
-    w.Step("OCIThreadIdGet", [&] { return OCIThreadIdGet(w.env, w.err, id); });
-    w.Step("OCIThreadHndInit", [&] { return OCIThreadHndInit(w.env, w.err, &handle); });
+    w.STEP(OCIThreadIdGet, w.env, w.err, id);
+    w.STEP(OCIThreadHndInit, w.env, w.err, &handle);
     w.AtEnd([&w] { return OCIThreadHndDestroy(w.env, w.err, &handle); });
     static int ran;
     ran = 0;
@@ -328,13 +298,13 @@ void Threads(World& w) {
         throw;
     }
     try {
-        w.Step("OCIThreadJoin", [&] { return OCIThreadJoin(w.env, w.err, handle); });
+        w.STEP(OCIThreadJoin, w.env, w.err, handle);
     } catch (const Stopped&) {
         EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_SUCCESS) << "asked again";
         EXPECT_EQ(OCIThreadClose(w.env, w.err, handle), OCI_SUCCESS);
         throw;
     }
-    w.Surely("OCIThreadClose", [&] { return OCIThreadClose(w.env, w.err, handle); });
+    w.SURELY(OCIThreadClose, w.env, w.err, handle);
     w.See(ran);
 }
 

@@ -90,18 +90,14 @@ void ArrayOfStructures(World& w) {
     OCIBind* const binds[] = {w.Bind(1, {&rows[0].number, 8, SQLT_INT}),
                               w.Bind(2, {rows[0].text, 40, SQLT_STR, &rows[0].indicator})};
     for (OCIBind* bind : binds) {
-        w.Step("OCIBindArrayOfStruct", [&] {
-            return OCIBindArrayOfStruct(bind, w.err, sizeof(Row), sizeof(Row), 0, 0);
-        });
+        w.STEP(OCIBindArrayOfStruct, bind, w.err, sizeof(Row), sizeof(Row), 0, 0);
     }
     ExecuteArray(w, 3);
     w.Prepare("select a, b from t order by a");
     OCIDefine* const defines[] = {w.Define(1, {&back[0].number, 8, SQLT_INT}),
                                   w.Define(2, {back[0].text, 40, SQLT_STR, &back[0].indicator})};
     for (OCIDefine* define : defines) {
-        w.Step("OCIDefineArrayOfStruct", [&] {
-            return OCIDefineArrayOfStruct(define, w.err, sizeof(Row), sizeof(Row), 0, 0);
-        });
+        w.STEP(OCIDefineArrayOfStruct, define, w.err, sizeof(Row), sizeof(Row), 0, 0);
     }
     w.Execute(4);
     for (const Row& row : back) w.See(row.indicator == -1 ? "-" : row.text);
@@ -127,7 +123,7 @@ void BatchErrors(World& w) {
         dvoid* row = nullptr;
         w.err = other;
         try {
-            w.Step("OCIParamGet", [&] { return OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, index); });
+            w.STEP(OCIParamGet, err, OCI_HTYPE_ERROR, other, &row, index);
         } catch (const Stopped&) {
             w.err = err;
             throw;
@@ -322,7 +318,7 @@ void BlockWithResultSet(World& w) {
     w.Prepare("begin open :c for select 'a value that is not short at all' from dual; end;");
     w.Bind(1, {&result, 8, SQLT_RSET});
     w.Execute();
-    w.Step("OCIResultSetToStmt", [&] { return OCIResultSetToStmt(static_cast<OCIResult*>(result), w.err); });
+    w.STEP(OCIResultSetToStmt, static_cast<OCIResult*>(result), w.err);
     type = OCI_HTYPE_STMT;
     OCIStmt* const block = std::exchange(w.stmt, static_cast<OCIStmt*>(result));
     char text[40] = "";
@@ -389,13 +385,9 @@ void PiecesIn(World& w) {
         dvoid* handle = nullptr;
         ub4 type = 0, iteration = 0, index = 0;
         ub1 direction = 0, piece = 0;
-        w.Step("OCIStmtGetPieceInfo", [&] {
-            return OCIStmtGetPieceInfo(w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
-        });
+        w.STEP(OCIStmtGetPieceInfo, w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
         ub4 length = World::Size(step.data);
-        w.Step("OCIStmtSetPieceInfo", [&] {
-            return OCIStmtSetPieceInfo(handle, type, w.err, step.data, &length, step.piece, nullptr, nullptr);
-        });
+        w.STEP(OCIStmtSetPieceInfo, handle, type, w.err, step.data, &length, step.piece, nullptr, nullptr);
         code = ExecuteArray(w, 2);
     }
     EXPECT_EQ(code, OCI_SUCCESS);
@@ -404,7 +396,7 @@ void PiecesIn(World& w) {
 
 void StatementCache(World& w) {
     ub4 size = 2;
-    w.Step("OCIAttrSet", [&] { return OCIAttrSet(w.svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, w.err); });
+    w.STEP(OCIAttrSet, w.svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, w.err);
     w.AtEnd([&w] {
         ub4 none = 0;
         return OCIAttrSet(w.svc, OCI_HTYPE_SVCCTX, &none, 0, OCI_ATTR_STMTCACHESIZE, w.err);
@@ -413,19 +405,15 @@ void StatementCache(World& w) {
     for (const char digit : {'1', '2', '1', '3', '2'}) {
         const std::string sql = std::string("select ") + digit + " from dual";
         OCIStmt* statement = nullptr;
-        w.Step("OCIStmtPrepare2", [&] {
-            return OCIStmtPrepare2(w.svc, &statement, w.err, World::Text(sql), World::Size(sql), nullptr, 0,
-                                   OCI_NTV_SYNTAX, OCI_DEFAULT);
-        });
+        w.STEP(OCIStmtPrepare2, w.svc, &statement, w.err, World::Text(sql), World::Size(sql), nullptr, 0,
+               OCI_NTV_SYNTAX, OCI_DEFAULT);
         sb4 value = 0;
         w.stmt = statement;
         bool released = false;
         try {
             w.Define(1, {&value, 4, SQLT_INT});
             w.Execute(1);
-            w.Step("OCIStmtRelease", [&] {
-                return OCIStmtRelease(statement, w.err, World::Text("a key that is not short at all"), 30, OCI_DEFAULT);
-            });
+            w.STEP(OCIStmtRelease, statement, w.err, World::Text("a key that is not short at all"), 30, OCI_DEFAULT);
             released = true;
             w.See(value);
         } catch (const Stopped&) {
@@ -445,13 +433,11 @@ void DescribedColumns(World& w) {
     const ub4 count = w.Attribute<ub4>(OCI_ATTR_PARAM_COUNT);
     for (ub4 position = 1; position <= count; ++position) {
         dvoid* parameter = nullptr;
-        w.Step("OCIParamGet", [&] { return OCIParamGet(w.stmt, OCI_HTYPE_STMT, w.err, &parameter, position); });
+        w.STEP(OCIParamGet, w.stmt, OCI_HTYPE_STMT, w.err, &parameter, position);
         w.AtEnd([parameter] { return OCIDescriptorFree(parameter, OCI_DTYPE_PARAM); });
         OraText* name = nullptr;
         ub4 length = 0;
-        w.Step("OCIAttrGet", [&] {
-            return OCIAttrGet(parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, w.err);
-        });
+        w.STEP(OCIAttrGet, parameter, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, w.err);
         w.See({reinterpret_cast<char*>(name), length});
         w.See(w.Attribute<ub2>(OCI_ATTR_DATA_TYPE, parameter, OCI_DTYPE_PARAM));
     }
@@ -459,10 +445,8 @@ void DescribedColumns(World& w) {
     ub1 lengths[3], indicator_lengths[3], repeated[3];
     OCIBind* binds[3];
     sb4 found = 0;
-    w.Step("OCIStmtGetBindInfo", [&] {
-        return OCIStmtGetBindInfo(w.stmt, w.err, 3, 1, &found, names, lengths, indicators, indicator_lengths, repeated,
-                                  binds);
-    });
+    w.STEP(OCIStmtGetBindInfo, w.stmt, w.err, 3, 1, &found, names, lengths, indicators, indicator_lengths, repeated,
+           binds);
     w.See(found);
     w.See({reinterpret_cast<char*>(names[1]), lengths[1]});
 }

@@ -43,46 +43,36 @@ void World::OpenSession() {
 // ---- Steps
 
 void World::Prepare(std::string_view sql) {
-    Step("OCIStmtPrepare", [&] {
-        return OCIStmtPrepare(stmt, err, Text(sql), Size(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
-    });
+    STEP(OCIStmtPrepare, stmt, err, Text(sql), Size(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
 }
 
 OCIBind* World::Bind(ub4 position, const Area& area, ub4 mode, ub4 most, ub4* current) {
     OCIBind* bind = nullptr;
-    Step("OCIBindByPos", [&] {
-        return OCIBindByPos(stmt, &bind, err, position, area.value, area.size, area.type, area.indicators, area.lengths,
-                            area.codes, most, current, mode);
-    });
+    STEP(OCIBindByPos, stmt, &bind, err, position, area.value, area.size, area.type, area.indicators, area.lengths,
+         area.codes, most, current, mode);
     return bind;
 }
 
 OCIBind* World::BindName(std::string_view name, const Area& area, ub4 most, ub4* current) {
     OCIBind* bind = nullptr;
-    Step("OCIBindByName", [&] {
-        return OCIBindByName(stmt, &bind, err, Text(name), static_cast<sb4>(name.size()), area.value, area.size,
-                             area.type, area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT);
-    });
+    STEP(OCIBindByName, stmt, &bind, err, Text(name), static_cast<sb4>(name.size()), area.value, area.size, area.type,
+         area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT);
     return bind;
 }
 
 OCIDefine* World::Define(ub4 position, const Area& area, ub4 mode) {
     OCIDefine* define = nullptr;
-    Step("OCIDefineByPos", [&] {
-        return OCIDefineByPos(stmt, &define, err, position, area.value, area.size, area.type, area.indicators,
-                              area.lengths, area.codes, mode);
-    });
+    STEP(OCIDefineByPos, stmt, &define, err, position, area.value, area.size, area.type, area.indicators, area.lengths,
+         area.codes, mode);
     return define;
 }
 
 sword World::Execute(ub4 iterations, ub4 mode) {
-    return Step("OCIStmtExecute", [&] {
-        return OCIStmtExecute(svc, stmt, err, iterations, 0, nullptr, nullptr, mode);
-    });
+    return STEP(OCIStmtExecute, svc, stmt, err, iterations, 0, nullptr, nullptr, mode);
 }
 
 sword World::Fetch(ub4 rows, ub2 orientation, sb4 offset) {
-    return Step("OCIStmtFetch2", [&] { return OCIStmtFetch2(stmt, err, rows, orientation, offset, OCI_DEFAULT); });
+    return STEP(OCIStmtFetch2, stmt, err, rows, orientation, offset, OCI_DEFAULT);
 }
 
 void World::Run(std::string_view sql) {

@@ -168,6 +168,10 @@ private:
     bool rolled_back_ = false;    // says the record of the step that failed
 };
 
+// A step, or a call that never fails, that goes by the name of its function.
+#define STEP(function, ...) Step(#function, [&] { return function(__VA_ARGS__); })
+#define SURELY(function, ...) Surely(#function, [&] { return function(__VA_ARGS__); })
+
 struct Scenario {
     const char* name;
     Ground ground;

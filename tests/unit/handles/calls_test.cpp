@@ -73,7 +73,10 @@ TEST_F(CallsTest, UserMemoryComesZeroedAndIsFoundAgain) {
     for (int index = 0; index < 100; ++index) ASSERT_EQ(static_cast<char*>(extra)[index], 0);
     std::memset(extra, 1, 100);
     EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_USER_MEMORY), extra);
-    EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_ENV), env_);
+    ub4 size = 0;
+    dvoid* of = nullptr;
+    EXPECT_EQ(Answer(OCIAttrGet(handle, OCI_HTYPE_STMT, &of, &size, OCI_ATTR_ENV, err_)), 0);
+    EXPECT_TRUE(of == env_ && size == sizeof of) << size;
     EXPECT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, SIZE_MAX, &extra), OCI_ERROR) << "more than there is";
     EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 1019);
 }
@@ -359,6 +362,8 @@ TEST_F(CallsTest, PasswordChange) {
     ASSERT_EQ(Answer(OCIAttrSet(other, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
     EXPECT_EQ(change(other, "ann", "three", "four", 0), 1012);
     EXPECT_EQ(change(other, "ann", "wrong", "four", OCI_AUTH), 1017);
+    EXPECT_EQ(change(other, "ann", "three", std::string(1000, 'x').c_str(), OCI_AUTH), 1017);
+    EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012) << "nor is the session left";
     EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 0);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 0) << "the change has begun a session";
     EXPECT_EQ(change(other, "ann", "four", "five", 0), 0);
@@ -408,6 +413,9 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     OCIEnv* env = nullptr;
     ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
     EXPECT_GT(memory.out, 0);
+    dvoid *handle = nullptr, *extra = nullptr;
+    ASSERT_EQ(OCIHandleAlloc(env, &handle, OCI_HTYPE_STMT, 9, &extra), OCI_SUCCESS);
+    EXPECT_EQ(std::string(static_cast<char*>(extra), 9), std::string(9, '\0'));
     EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 1);
     EXPECT_EQ(Attribute<ub2>(env, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
@@ -415,6 +423,9 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     ASSERT_EQ(OCITerminate(OCI_DEFAULT), OCI_SUCCESS);
     ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
     EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 0) << "forgotten";
+    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, OwnMemory::Allocate, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
+    EXPECT_EQ(memory.out, 0) << "one function alone is none";
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
 }
 

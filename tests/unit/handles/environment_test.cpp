@@ -11,29 +11,15 @@ namespace {
 TEST(ErrorTexts, NumberStateAndWords) {
     const struct { int number; const char* state; const char* text;
     } cases[] = {{0, "00000", "normal, successful completion"},
-                 {1, "23000", "unique constraint violated"},
-                 {942, "42000", "table or view does not exist"},
-                 {1001, "24000", "invalid cursor"},
-                 {1017, "28000", "invalid user name or password; logon denied"},
-                 {1095, "02000", "DML processed no rows"},
-                 {1403, "02000", "no data found"},
-                 {1405, "22002", "fetched value is null"},
-                 {1422, "21000", nullptr},
-                 {1438, "22003", nullptr},
-                 {1476, "22012", "division by zero"},
-                 {1480, "22024", nullptr},
-                 {1722, "42000", "invalid number"},
-                 {1843, "22008", "not a valid month"},
-                 {2091, "40000", nullptr},
-                 {2292, "23000", nullptr},
-                 {3114, "66000", "not connected"},
-                 {6511, "24000", nullptr},
-                 {6512, "65000", nullptr},
-                 {8177, "40001", nullptr},
-                 {12154, "66000", nullptr},
-                 {12899, "22001", nullptr},
-                 {20500, "HY000", "application error"},
-                 {24374, "HY000", "define missing before fetch"},
+                 {1, "23000", "unique constraint violated"}, {942, "42000", "table or view does not exist"},
+                 {1001, "24000", "invalid cursor"}, {1017, "28000", "invalid user name or password; logon denied"},
+                 {1095, "02000", "DML processed no rows"}, {1403, "02000", "no data found"},
+                 {1405, "22002", "fetched value is null"}, {1422, "21000", nullptr}, {1438, "22003", nullptr},
+                 {1476, "22012", "division by zero"}, {1480, "22024", nullptr}, {1722, "42000", "invalid number"},
+                 {1843, "22008", "not a valid month"}, {2091, "40000", nullptr}, {2292, "23000", nullptr},
+                 {3114, "66000", "not connected"}, {6511, "24000", nullptr}, {6512, "65000", nullptr},
+                 {8177, "40001", nullptr}, {12154, "66000", nullptr}, {12899, "22001", nullptr},
+                 {20500, "HY000", "application error"}, {24374, "HY000", "define missing before fetch"},
                  {99999, "HY000", "message not found"}};
     for (const auto& c : cases) {
         EXPECT_EQ(SqlState(c.number), c.state) << c.number;
@@ -45,6 +31,19 @@ TEST(ErrorTexts, NumberStateAndWords) {
     EXPECT_EQ(ErrorMessage(942, "SQLITE", "no such table: t\n"),
               "[KELP/SQLITE] ORA-00942: table or view does not exist: no such table: t\n");
     EXPECT_EQ(ErrorMessage(24374, "CLIENT", ""), "[KELP/CLIENT] ORA-24374: define missing before fetch\n");
+}
+
+TEST(ErrorLists, KeepWhatIsAdded) {
+    ErrorList list, other;
+    list.Add(Error(1));
+    list.Add(Error(942, "words"));
+    list.Add(Error(1403));
+    other.Add(Error(1017));
+    other.TakeFrom(list);
+    EXPECT_FALSE(list.At(1));
+    const int numbers[] = {1, 942, 1403};
+    for (std::size_t at = 1; at <= 3; ++at) EXPECT_EQ(other.At(at)->number, numbers[at - 1]);
+    EXPECT_FALSE(other.At(0) || other.At(4));
 }
 
 TEST(TextToBuffer, CutsBetweenCharacters) {

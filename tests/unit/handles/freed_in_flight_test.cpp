@@ -1,43 +1,188 @@
-// Handles and whole environments that one thread frees while others are inside calls on them.
-#include <gtest/gtest.h>
+// What becomes of objects that are freed while calls run: by callbacks of the call itself, by other threads, beside a
+// call that waits for long. Memory must not go too early, and not stay too long.
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include <atomic>
-#include <barrier>
-#include <cstdlib>
+#include <chrono>
+#include <functional>
 #include <thread>
-#include <vector>
 
-#include "kelpci.h"
-#include "oci.h"
+#include "support/at_once.h"
+#include "support/call_fixture.h"
 
 namespace {
 
-const OraText* Text(const char* text) { return reinterpret_cast<const OraText*>(text); }
+using namespace std::chrono_literals;
 
-// What the threads share; each pointer may be freed at any time.
-struct Shared {
+// The memory functions of an environment. The nth allocation calls `strike`, which frees the victim: its block must
+// outlast that, since the call that allocates is not over. Freed blocks are overwritten.
+struct StrikingMemory {
+    int countdown = 0;    // 0: not armed
+    std::function<void()> strike;
+    const void* victim = nullptr;
+    bool striking = false;
+    int struck = 0;
+    int too_early = 0;
+    int out = 0;
+
+    static dvoid* Allocate(dvoid* context, size_t size) {
+        auto& memory = *static_cast<StrikingMemory*>(context);
+        if (memory.countdown > 0 && --memory.countdown == 0) {
+            ++memory.struck;
+            memory.striking = true;
+            memory.strike();
+            memory.striking = false;
+        }
+        ++memory.out;
+        auto* block = static_cast<char*>(std::malloc(size + sizeof size));
+        std::memcpy(block, &size, sizeof size);
+        return block + sizeof size;
+    }
+    static void Free(dvoid* context, dvoid* given) {
+        auto& memory = *static_cast<StrikingMemory*>(context);
+        --memory.out;
+        size_t size = 0;
+        char* block = static_cast<char*>(given) - sizeof size;
+        std::memcpy(&size, block, sizeof size);
+        const auto* victim = static_cast<const char*>(memory.victim);
+        if (memory.striking && victim >= given && victim < static_cast<char*>(given) + size) ++memory.too_early;
+        std::memset(block, 0xDD, size + sizeof size);
+        std::free(block);
+    }
+};
+
+// What calls work on, in an environment of its own; each may be freed at any time.
+struct Objects {
     OCIEnv* env = nullptr;
     OCIError* err = nullptr;
     OCISvcCtx* svc = nullptr;
     OCIStmt* stmt = nullptr;
     OCIString* string = nullptr;
 
-    template <class Handle>
-    void New(Handle*& handle, ub4 type) {
-        ASSERT_EQ(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&handle), type, 0, nullptr), OCI_SUCCESS);
-    }
-    void Make() {
-        ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
-        New(err, OCI_HTYPE_ERROR);
+    void Make(const char* sql, StrikingMemory* memory = nullptr) {
+        ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, memory, memory ? StrikingMemory::Allocate : nullptr, nullptr,
+                               memory ? StrikingMemory::Free : nullptr, 0, nullptr), OCI_SUCCESS);
+        err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
         ASSERT_EQ(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(":memory:"), 8), OCI_SUCCESS);
-        New(stmt, OCI_HTYPE_STMT);
-        ASSERT_EQ(OCIStmtPrepare(stmt, err, Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+        stmt = NewStatement(sql);
         ASSERT_EQ(OCIStringAssignText(env, err, Text("kelp"), 4, &string), OCI_SUCCESS);
+    }
+    OCIStmt* NewStatement(const char* sql) const {
+        auto* made = NewHandle<OCIStmt>(env, OCI_HTYPE_STMT);
+        EXPECT_EQ(OCIStmtPrepare(made, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
+        return made;
+    }
+    sword Execute(OCIStmt* of, ub4 iterations = 0) const {
+        return OCIStmtExecute(svc, of, err, iterations, 0, nullptr, nullptr, OCI_DEFAULT);
     }
 };
 
+// ---- By callbacks
+
+// What a call of the cases works on. All of it may be freed by the strike.
+struct Struck : Objects {
+    StrikingMemory memory;
+    OCIString* source = nullptr;
+    dvoid* cursor = nullptr;
+
+    Struck() {
+        Make("begin open :c for select 1 from dual; end;", &memory);
+        EXPECT_EQ(OCIStringAssignText(env, err, Text("a longer text"), 13, &source), OCI_SUCCESS);
+        EXPECT_EQ(Bind(), OCI_SUCCESS);
+    }
+    sword Bind() {
+        OCIBind* bind = nullptr;
+        return OCIBindByPos(stmt, &bind, err, 1, &cursor, 0, SQLT_RSET, nullptr, nullptr, nullptr, 0, nullptr,
+                            OCI_DEFAULT);
+    }
+    void FreeString(OCIString* which) { OCIStringResize(env, err, 0, &which); }
+};
+
+const struct { const char* name; sword (*call)(Struck&); } kCalls[] = {
+    {"OCIHandleAlloc", [](Struck& o) {
+         dvoid* made = nullptr;
+         return OCIHandleAlloc(o.env, &made, OCI_HTYPE_STMT, 16, nullptr);
+     }},
+    {"OCIDefineByPos", [](Struck& o) {
+         OCIDefine* define = nullptr;
+         static sb4 value;
+         return OCIDefineByPos(o.stmt, &define, o.err, 1, &value, sizeof value, SQLT_INT, nullptr, nullptr, nullptr,
+                               OCI_DEFAULT);
+     }},
+    {"OCIBindByPos", [](Struck& o) { return o.Bind(); }},
+    {"OCIStringAssign", [](Struck& o) { return OCIStringAssign(o.env, o.err, o.source, &o.string); }},
+    {"OCIStringResize", [](Struck& o) { return OCIStringResize(o.env, o.err, 100, &o.string); }},
+    {"block with a result set", [](Struck& o) { return o.Execute(o.stmt, 1); }},
+};
+
+const struct { const char* name; const void* (*victim)(const Struck&); void (*strike)(Struck&); } kStrikes[] = {
+    {"environment", [](const Struck& o) -> const void* { return o.env; },
+     [](Struck& o) { OCIHandleFree(o.env, OCI_HTYPE_ENV); }},
+    {"error handle", [](const Struck& o) -> const void* { return o.err; },
+     [](Struck& o) { OCIHandleFree(o.err, OCI_HTYPE_ERROR); }},
+    {"service context", [](const Struck& o) -> const void* { return o.svc; },
+     [](Struck& o) { OCIHandleFree(o.svc, OCI_HTYPE_SVCCTX); }},
+    {"statement", [](const Struck& o) -> const void* { return o.stmt; },
+     [](Struck& o) { OCIHandleFree(o.stmt, OCI_HTYPE_STMT); }},
+    {"nothing, but prepares anew", [](const Struck& o) -> const void* { return o.env; },
+     [](Struck& o) {
+         auto* own = NewHandle<OCIError>(o.env, OCI_HTYPE_ERROR);
+         OCIStmtPrepare(o.stmt, own, Text("begin null; end;"), 16, OCI_NTV_SYNTAX, OCI_DEFAULT);
+     }},
+    {"string", [](const Struck& o) -> const void* { return o.string; }, [](Struck& o) { o.FreeString(o.string); }},
+    {"the string that is read", [](const Struck& o) -> const void* { return o.source; },
+     [](Struck& o) { o.FreeString(o.source); }},
+};
+
+TEST(Callbacks, MayFreeWhateverTheirCallWorksOn) {
+    const sb4 before = OCI_memGetMemCount();
+    int struck = 0;
+    for (const auto& call : kCalls) {
+        for (const auto& strike : kStrikes) {
+            for (int nth = 1; nth <= 3; ++nth) {
+                Struck objects;
+                OCIEnv* const env = objects.env;
+                objects.memory.victim = strike.victim(objects);
+                objects.memory.strike = [&] { strike.strike(objects); };
+                objects.memory.countdown = nth;
+                const sword rc = call.call(objects);
+                objects.memory.countdown = 0;
+                struck += objects.memory.struck;
+                EXPECT_TRUE(rc == OCI_SUCCESS || rc == OCI_ERROR) << call.name << " frees " << strike.name << ": " << rc;
+                EXPECT_EQ(objects.memory.too_early, 0) << call.name << " frees " << strike.name;
+                OCIHandleFree(env, OCI_HTYPE_ENV);
+                EXPECT_EQ(objects.memory.out, 0) << call.name << " frees " << strike.name;
+            }
+        }
+    }
+    EXPECT_GE(struck, 30) << "callbacks that were called at all";
+    EXPECT_EQ(OCI_memGetMemCount(), before);
+}
+
+// A string that the memory functions change while it is read or changed: what comes out is one of the two contents.
+TEST(Callbacks, MayChangeTheStringsThatTheirCallWorksOn) {
+    for (const bool source : {true, false}) {
+        Struck objects;
+        objects.memory.strike = [&] {
+            OCIString*& changed = source ? objects.source : objects.string;
+            OCIStringAssignText(objects.env, objects.err, Text("other content, longer than before"), 33, &changed);
+        };
+        objects.memory.countdown = 1;
+        ASSERT_EQ(OCIStringAssign(objects.env, objects.err, objects.source, &objects.string), OCI_SUCCESS);
+        const std::string seen(reinterpret_cast<char*>(OCIStringPtr(objects.env, objects.string)),
+                               OCIStringSize(objects.env, objects.string));
+        EXPECT_EQ(seen, source ? "other content" : "a longer text") << "no more than there was room for";
+        EXPECT_EQ(OCIHandleFree(objects.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+        EXPECT_EQ(objects.memory.out, 0);
+    }
+}
+
+// ---- By other threads
+
 // Answers how many of the calls found their handles.
-int CallOnce(const Shared& shared, int round) {
+int CallOnce(const Objects& shared, int round) {
     OCINumber number{};
     sb4 code = 0;
     ub4 size = 0;
@@ -48,7 +193,7 @@ int CallOnce(const Shared& shared, int round) {
         OCINumberSqrt(shared.err, &number, nullptr),    // leaves a record
         OCIErrorGet(shared.err, 1, nullptr, &code, text, sizeof text, OCI_HTYPE_ERROR),
         OCIStringAllocSize(shared.env, shared.err, string, &size),
-        OCIStmtExecute(shared.svc, shared.stmt, shared.err, 0, 0, nullptr, nullptr, OCI_DEFAULT),
+        shared.Execute(shared.stmt),
         OCIAttrGet(shared.stmt, OCI_HTYPE_STMT, &size, nullptr, OCI_ATTR_PARAM_COUNT, shared.err),
     };
     int found = 0;
@@ -56,14 +201,14 @@ int CallOnce(const Shared& shared, int round) {
     return found;
 }
 
-class FreedInFlight : public testing::TestWithParam<void (*)(Shared&)> {};
+class FreedInFlight : public testing::TestWithParam<void (*)(Objects&)> {};
 
 TEST_P(FreedInFlight, CallsEndAndNothingIsLeft) {
     const sb4 before = OCI_memGetMemCount();
     constexpr int kRounds = 30, kThreads = 3;
     for (int round = 0; round < kRounds; ++round) {
-        Shared shared;
-        shared.Make();
+        Objects shared;
+        shared.Make("select 1 from dual");
         std::atomic<int> started{0};
         std::atomic<bool> stop{false};
         std::vector<std::thread> threads;
@@ -84,101 +229,13 @@ TEST_P(FreedInFlight, CallsEndAndNothingIsLeft) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Order, FreedInFlight, testing::Values(
-    +[](Shared&) {},    // the environment, and all with it
-    +[](Shared& shared) { OCIHandleFree(shared.err, OCI_HTYPE_ERROR); },
-    +[](Shared& shared) { OCIHandleFree(shared.stmt, OCI_HTYPE_STMT); },
-    +[](Shared& shared) {
+    +[](Objects&) {},    // the environment, and all with it
+    +[](Objects& shared) { OCIHandleFree(shared.err, OCI_HTYPE_ERROR); },
+    +[](Objects& shared) { OCIHandleFree(shared.stmt, OCI_HTYPE_STMT); },
+    +[](Objects& shared) {
         OCIHandleFree(shared.svc, OCI_HTYPE_SVCCTX);
         OCIHandleFree(shared.stmt, OCI_HTYPE_STMT);
     }));
-
-TEST(ServerHandles, SessionsOfOneServerBeginAndEndInSeveralThreads) {
-    Shared shared;
-    shared.Make();
-    OCIServer* server = nullptr;
-    shared.New(server, OCI_HTYPE_SERVER);
-    ASSERT_EQ(OCIServerAttach(server, shared.err, Text(":memory:"), 8, OCI_DEFAULT), OCI_SUCCESS);
-    std::atomic<int> failures{0};
-    std::vector<std::thread> threads;
-    for (int index = 0; index < 4; ++index) {
-        threads.emplace_back([&] {
-            OCIError* err = nullptr;
-            OCISvcCtx* svc = nullptr;
-            OCISession* session = nullptr;
-            shared.New(err, OCI_HTYPE_ERROR);
-            shared.New(svc, OCI_HTYPE_SVCCTX);
-            shared.New(session, OCI_HTYPE_SESSION);
-            failures += OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err) != OCI_SUCCESS;
-            failures += OCIAttrSet(svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION, err) != OCI_SUCCESS;
-            for (int round = 0; round < 20; ++round) {
-                failures += OCISessionBegin(svc, err, session, OCI_CRED_EXT, OCI_DEFAULT) != OCI_SUCCESS;
-                OCIBreak(server, err);
-                OCIReset(server, err);
-                failures += OCISessionEnd(svc, err, session, OCI_DEFAULT) != OCI_SUCCESS;
-            }
-        });
-    }
-    for (std::thread& thread : threads) thread.join();
-    EXPECT_EQ(failures, 0);
-    EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
-}
-
-// What several threads do to the same handles at once: work(index), all let go together.
-template <class Work>
-void AtOnce(int count, Work work) {
-    std::barrier start(count);
-    std::vector<std::thread> threads;
-    for (int index = 0; index < count; ++index) {
-        threads.emplace_back([&, index] {
-            start.arrive_and_wait();
-            work(index);
-        });
-    }
-    for (std::thread& thread : threads) thread.join();
-}
-
-TEST(FreedTwice, OneOfTheThreadsThatFreeAHandleDoes) {
-    const sb4 before = OCI_memGetMemCount();
-    Shared shared;
-    shared.Make();
-    for (int round = 0; round < 200; ++round) {
-        OCIServer* server = nullptr;
-        shared.New(server, OCI_HTYPE_SERVER);
-        std::atomic<int> freed{0};
-        AtOnce(3, [&](int) { freed += OCIHandleFree(server, OCI_HTYPE_SERVER) == OCI_SUCCESS; });
-        ASSERT_EQ(freed, 1) << "round " << round;
-    }
-    EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
-    EXPECT_EQ(OCI_memGetMemCount(), before);
-}
-
-TEST(ServerHandles, BrokenAndDetachedWhileASessionIsFreed) {
-    const sb4 before = OCI_memGetMemCount();
-    Shared shared;
-    shared.Make();
-    for (int round = 0; round < 200; ++round) {
-        OCIError* errors[3] = {};
-        for (OCIError*& error : errors) shared.New(error, OCI_HTYPE_ERROR);
-        OCIServer* server = nullptr;
-        OCISession* session = nullptr;
-        OCISvcCtx* svc = nullptr;
-        shared.New(server, OCI_HTYPE_SERVER);
-        shared.New(session, OCI_HTYPE_SESSION);
-        shared.New(svc, OCI_HTYPE_SVCCTX);
-        ASSERT_EQ(OCIServerAttach(server, shared.err, Text(":memory:"), 8, OCI_DEFAULT), OCI_SUCCESS);
-        ASSERT_EQ(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, shared.err), OCI_SUCCESS);
-        ASSERT_EQ(OCISessionBegin(svc, shared.err, session, OCI_CRED_EXT, OCI_DEFAULT), OCI_SUCCESS);
-        AtOnce(3, [&](int index) {
-            if (index == 0) OCIHandleFree(session, OCI_HTYPE_SESSION);
-            if (index == 1) OCIBreak(server, errors[1]);
-            if (index == 2) OCIServerDetach(server, errors[2], OCI_DEFAULT);
-        });
-        EXPECT_EQ(OCIHandleFree(session, OCI_HTYPE_SESSION), OCI_INVALID_HANDLE);
-        EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_SUCCESS);
-    }
-    EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
-    EXPECT_EQ(OCI_memGetMemCount(), before);
-}
 
 // The memory functions of an environment in which an allocation waits until it may go on: a call that is in.
 struct Gate {
@@ -200,14 +257,11 @@ struct Gate {
 TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
     const sb4 before = OCI_memGetMemCount();
     for (int round = 0; round < 100; ++round) {
-        Shared shared;
-        shared.Make();
-        OCIStmt* other = nullptr;
-        shared.New(other, OCI_HTYPE_STMT);
-        const OraText* sql = Text("select 1 from dual union all select 2 from dual");
-        ASSERT_EQ(OCIStmtPrepare(shared.stmt, shared.err, sql, 47, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
-        ASSERT_EQ(OCIStmtPrepare(other, shared.err, sql, 47, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
-        ASSERT_EQ(OCIStmtExecute(shared.svc, shared.stmt, shared.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), 0);
+        const char* const sql = "select 1 from dual union all select 2 from dual";
+        Objects shared;
+        shared.Make(sql);
+        OCIStmt* other = shared.NewStatement(sql);
+        ASSERT_EQ(shared.Execute(shared.stmt), OCI_SUCCESS);
         Gate gate;
         OCIEnv* elsewhere = nullptr;
         ASSERT_EQ(OCIEnvCreate(&elsewhere, OCI_THREADED, &gate, Gate::Allocate, nullptr, Gate::Free, 0, nullptr), 0);
@@ -221,7 +275,7 @@ TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
         std::thread working([&] {
             gate.open = true;
             for (int call = 0; call < round % 10; ++call)
-                EXPECT_EQ(OCIStmtExecute(shared.svc, other, shared.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), 0);
+                EXPECT_EQ(shared.Execute(other), OCI_SUCCESS);
             EXPECT_EQ(OCILogoff(shared.svc, shared.err), OCI_SUCCESS);
         });
         in.join();
@@ -230,6 +284,173 @@ TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
         EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
         ASSERT_EQ(OCI_memGetMemCount(), before) << "round " << round;
     }
+}
+
+// ---- Beside a call that waits
+
+class BesideAWait : public CallFixture {
+protected:
+    BesideAWait() : CallFixture(OCI_THREADED) {}
+    void SetUp() override {
+        CallFixture::SetUp();
+        ASSERT_EQ(OCIThreadInit(env_, err_), OCI_SUCCESS);
+        wait_err_ = New<OCIError>(OCI_HTYPE_ERROR);
+    }
+    void TearDown() override {
+        EXPECT_EQ(OCIThreadTerm(env_, err_), OCI_SUCCESS);
+        CallFixture::TearDown();
+    }
+    // Makes and frees statements while `wait` runs in another thread, which `end` makes return; the wait is given time
+    // to begin.
+    void MakeAndFree(const std::function<void()>& wait, const std::function<void()>& end) {
+        constexpr int kOld = 100, kRounds = 30'000;
+        std::vector<dvoid*> old(kOld);
+        for (dvoid*& handle : old) ASSERT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 8, nullptr), OCI_SUCCESS);
+        const sb4 before = OCI_memGetMemCount();
+        std::atomic<bool> over{false};
+        std::thread waiting([&] {
+            wait();
+            over = true;
+        });
+        std::this_thread::sleep_for(100ms);
+        sb4 most = 0;
+        for (int round = 0; round < kRounds; ++round) {
+            dvoid* handle = nullptr;
+            ASSERT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 8, nullptr), OCI_SUCCESS);
+            ASSERT_EQ(OCIHandleFree(handle, OCI_HTYPE_STMT), OCI_SUCCESS);
+            most = std::max(most, OCI_memGetMemCount());
+        }
+        EXPECT_FALSE(over) << "the wait did not last";
+        EXPECT_LE(most - before, 8) << "blocks that wait for the end of the wait";
+        // What the waiting call might know waits for it, and for no longer.
+        for (dvoid* handle : old) ASSERT_EQ(OCIHandleFree(handle, OCI_HTYPE_STMT), OCI_SUCCESS);
+        end();
+        waiting.join();
+        EXPECT_LE(OCI_memGetMemCount(), before - 2 * kOld + 8);
+    }
+
+    OCIError* wait_err_ = nullptr;
+};
+
+TEST_F(BesideAWait, ForAThreadToEnd) {
+    static std::atomic<bool> stop;
+    stop = false;
+    OCIThreadHandle* handle = nullptr;
+    ASSERT_EQ(OCIThreadHndInit(env_, err_, &handle), OCI_SUCCESS);
+    const auto routine = [](dvoid*) { while (!stop) std::this_thread::sleep_for(1ms); };
+    ASSERT_EQ(OCIThreadCreate(env_, err_, routine, nullptr, nullptr, handle), OCI_SUCCESS);
+    MakeAndFree([&] { EXPECT_EQ(OCIThreadJoin(env_, wait_err_, handle), OCI_SUCCESS); }, [] { stop = true; });
+}
+
+TEST_F(BesideAWait, ForAMutex) {
+    OCIThreadMutex* mutex = nullptr;
+    ASSERT_EQ(OCIThreadMutexInit(env_, err_, &mutex), OCI_SUCCESS);
+    ASSERT_EQ(OCIThreadMutexAcquire(env_, err_, mutex), OCI_SUCCESS);
+    MakeAndFree(
+        [&] {
+            EXPECT_EQ(OCIThreadMutexAcquire(env_, wait_err_, mutex), OCI_SUCCESS);
+            EXPECT_EQ(OCIThreadMutexRelease(env_, wait_err_, mutex), OCI_SUCCESS);
+        },
+        [&] { EXPECT_EQ(OCIThreadMutexRelease(env_, err_, mutex), OCI_SUCCESS); });
+}
+
+TEST_F(BesideAWait, ForAPipe) {
+    const std::string name = "/tmp/kelp-pipe-" + std::to_string(getpid());
+    ASSERT_EQ(mkfifo(name.c_str(), 0600), 0);
+    ASSERT_EQ(OCIFileInit(env_, err_), OCI_SUCCESS);
+    OCIFileObject* file = nullptr;
+    const int other_end = open(name.c_str(), O_RDWR);
+    ASSERT_EQ(OCIFileOpen(env_, err_, &file, Text(name), nullptr, OCI_FILE_READ_ONLY, OCI_FILE_EXIST, OCI_FILE_BIN), 0);
+    MakeAndFree(
+        [&] {
+            char byte = 0;
+            ub4 count = 0;
+            EXPECT_EQ(OCIFileRead(env_, wait_err_, file, &byte, 1, &count), OCI_SUCCESS);
+            EXPECT_EQ(byte, 'k');
+        },
+        [&] { EXPECT_EQ(write(other_end, "k", 1), 1); });
+    EXPECT_EQ(OCIFileClose(env_, err_, file), OCI_SUCCESS);
+    close(other_end);
+    unlink(name.c_str());
+    EXPECT_EQ(OCIFileTerm(env_, err_), OCI_SUCCESS);
+}
+
+// One thread runs the query, a second one waits for its turn on the same session.
+TEST_F(BesideAWait, ForAQueryAndForItsSession) {
+    Objects objects;
+    objects.Make("with recursive r(n) as (select 1 union all select n + 1 from r) select max(n) from r");
+    OCIStmt* short_one = objects.NewStatement("select 1 from dual");
+    auto* other_err = NewHandle<OCIError>(objects.env, OCI_HTYPE_ERROR);
+    std::thread other;
+    MakeAndFree(
+        [&] {
+            other = std::thread([&] {
+                std::this_thread::sleep_for(20ms);
+                EXPECT_EQ(OCIStmtExecute(objects.svc, short_one, other_err, 0, 0, nullptr, nullptr, OCI_DEFAULT),
+                          OCI_SUCCESS);
+            });
+            EXPECT_EQ(objects.Execute(objects.stmt), OCI_ERROR);
+            other.join();
+        },
+        [&] { EXPECT_EQ(OCIBreak(objects.svc, wait_err_), OCI_SUCCESS); });
+    EXPECT_EQ(OCIHandleFree(objects.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+// ---- Everything at once
+
+// Threads that make, use and free the same few handles and strings, now and then below a mutex that they wait for and
+// below a memory function that frees.
+TEST_F(BesideAWait, HandlesMadeUsedAndFreedByAllThreads) {
+    constexpr int kThreads = 4, kPlaces = 6;
+    std::atomic<OCIStmt*> statements[kPlaces] = {};
+    std::atomic<OCIString*> strings[kPlaces] = {};
+    OCIThreadMutex* mutex = nullptr;
+    ASSERT_EQ(OCIThreadMutexInit(env_, err_, &mutex), OCI_SUCCESS);
+    std::atomic<int> wrong{0};
+    const auto end = std::chrono::steady_clock::now() + 1s;
+    AtOnce(kThreads, [&](int thread) {
+        unsigned seed = static_cast<unsigned>(thread) * 7919 + 1;
+        auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+        const auto expect = [&wrong](sword rc, sword other) { wrong += rc != OCI_SUCCESS && rc != other; };
+        while (std::chrono::steady_clock::now() < end) {
+            seed = seed * 1664525 + 1013904223;
+            const unsigned place = (seed >> 16) % kPlaces;
+            OCIStmt* stmt = statements[place];
+            OCIString* string = strings[place];
+            ub4 value = 0;
+            switch ((seed >> 24) % 8) {
+                case 0: {
+                    dvoid* fresh = nullptr;
+                    expect(OCIHandleAlloc(env_, &fresh, OCI_HTYPE_STMT, 32, nullptr), OCI_SUCCESS);
+                    stmt = statements[place].exchange(static_cast<OCIStmt*>(fresh));
+                    if (stmt) expect(OCIHandleFree(stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
+                    break;
+                }
+                case 1: {
+                    OCIString* fresh = nullptr;
+                    expect(OCIStringAssignText(env_, err, Text("some text"), 9, &fresh), OCI_SUCCESS);
+                    string = strings[place].exchange(fresh);
+                    if (string) expect(OCIStringResize(env_, err, 0, &string), OCI_SUCCESS);
+                    break;
+                }
+                case 2:
+                    expect(OCIThreadMutexAcquire(env_, err, mutex), OCI_SUCCESS);
+                    expect(OCIThreadMutexRelease(env_, err, mutex), OCI_SUCCESS);
+                    break;
+                case 3: {
+                    OCIString* copy = nullptr;
+                    if (string) expect(OCIStringAssign(env_, err, string, &copy), OCI_INVALID_HANDLE);
+                    if (copy) expect(OCIStringResize(env_, err, 0, &copy), OCI_SUCCESS);
+                    break;
+                }
+                default:
+                    if (stmt) expect(OCIAttrGet(stmt, OCI_HTYPE_STMT, &value, nullptr, OCI_ATTR_PREFETCH_ROWS, err),
+                                     OCI_INVALID_HANDLE);
+                    if (string) expect(OCIStringAllocSize(env_, err, string, &value), OCI_INVALID_HANDLE);
+            }
+        }
+    });
+    EXPECT_EQ(wrong, 0);
 }
 
 }  // namespace

@@ -1,13 +1,11 @@
 // Sessions: what their end does to the work done in them, what attributes tell of them, and several threads that begin,
 // use, break and end the same ones.
 #include <atomic>
-#include <barrier>
 #include <chrono>
 #include <functional>
-#include <future>
 #include <thread>
-#include <vector>
 
+#include "support/at_once.h"
 #include "support/call_fixture.h"
 
 namespace {
@@ -74,23 +72,13 @@ protected:
         EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION, err_)), 0);
         return svc;
     }
-    // work(index, error handle) in threads of their own, let go together. Ends the process when they hang.
+    // work(index, error handle) in threads of their own.
     void AtOnce(int count, const std::function<void(int, OCIError*)>& work) const {
-        std::barrier start(count);
-        std::vector<std::future<void>> done;
-        for (int index = 0; index < count; ++index) {
+        ::AtOnce(count, [&](int index) {
             auto* err = New<OCIError>(OCI_HTYPE_ERROR);
-            done.push_back(std::async(std::launch::async, [&, index, err] {
-                start.arrive_and_wait();
-                work(index, err);
-                OCIHandleFree(err, OCI_HTYPE_ERROR);
-            }));
-        }
-        for (std::future<void>& thread : done) {
-            if (thread.wait_for(60s) == std::future_status::ready) continue;
-            ADD_FAILURE() << "the threads wait for each other";
-            std::abort();
-        }
+            work(index, err);
+            OCIHandleFree(err, OCI_HTYPE_ERROR);
+        });
     }
 };
 
@@ -204,22 +192,8 @@ TEST_F(Sessions, AttributesFollowWhatHappens) {
     auto* session = Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
     const auto open = [&] { return Attribute<ub4>(session, OCI_HTYPE_SESSION, OCI_ATTR_NUM_OPEN_STMTS); };
     EXPECT_EQ(open(), 0u);
-    OCIStmt* statements[2];
-    for (OCIStmt*& stmt : statements) {
-        stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-        ASSERT_EQ(Run(svc, stmt, err_, "select 1 from dual", 0), 0);
-    }
-    EXPECT_EQ(open(), 2u);
-    ASSERT_EQ(Run(svc, statements[0], err_, "select 2 from dual", 0), 0);
-    EXPECT_EQ(open(), 2u) << "executed again";
-    ub4 row = 0;
-    OCIDefine* define = nullptr;
-    ASSERT_EQ(Answer(OCIDefineByPos(statements[0], &define, err_, 1, &row, sizeof row, SQLT_INT, nullptr, nullptr,
-                                    nullptr, OCI_DEFAULT)), 0);
-    ASSERT_EQ(Answer(OCIStmtFetch2(statements[0], err_, 0, OCI_FETCH_NEXT, 0, OCI_DEFAULT)), 0);
-    EXPECT_EQ(open(), 1u) << "given up by a fetch of no rows";
-    ASSERT_EQ(OCIHandleFree(statements[1], OCI_HTYPE_STMT), OCI_SUCCESS);
-    EXPECT_EQ(open(), 0u);
+    ASSERT_EQ(Run(svc, New<OCIStmt>(OCI_HTYPE_STMT), err_, "select 1 from dual", 0), 0);
+    EXPECT_EQ(open(), 1u);
     ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
     EXPECT_EQ(open(), 0u);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 0u) << "goes with the logon";
@@ -358,6 +332,45 @@ TEST_F(Sessions, AttachedDetachedAndAskedByThreads) {
             }
         }
     });
+}
+
+TEST_F(Sessions, OfOneServerBegunAndEndedByThreads) {
+    OCIServer* server = NewServer(":memory:");
+    AtOnce(4, [&](int, OCIError* err) {
+        auto* session = New<OCISession>(OCI_HTYPE_SESSION);
+        OCISvcCtx* svc = NewContext(server, session);
+        for (int round = 0; round < 20; ++round) {
+            EXPECT_EQ(OCISessionBegin(svc, err, session, OCI_CRED_EXT, OCI_DEFAULT), OCI_SUCCESS);
+            OCIBreak(server, err);
+            OCIReset(server, err);
+            EXPECT_EQ(OCISessionEnd(svc, err, session, OCI_DEFAULT), OCI_SUCCESS);
+        }
+    });
+}
+
+TEST_F(Sessions, FreedWhileTheirServerIsBrokenAndDetached) {
+    for (int round = 0; round < 200; ++round) {
+        OCIServer* server = NewServer(":memory:");
+        auto* session = New<OCISession>(OCI_HTYPE_SESSION);
+        OCISvcCtx* svc = NewContext(server, session);
+        ASSERT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_EXT, OCI_DEFAULT)), 0);
+        AtOnce(3, [&](int index, OCIError* err) {
+            if (index == 0) OCIHandleFree(session, OCI_HTYPE_SESSION);
+            if (index == 1) OCIBreak(server, err);
+            if (index == 2) OCIServerDetach(server, err, OCI_DEFAULT);
+        });
+        EXPECT_EQ(OCIHandleFree(session, OCI_HTYPE_SESSION), OCI_INVALID_HANDLE);
+        EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_SUCCESS);
+    }
+}
+
+TEST_F(Sessions, FreedByOneOfTheThreadsThatFreeThem) {
+    for (int round = 0; round < 200; ++round) {
+        auto* session = New<OCISession>(OCI_HTYPE_SESSION);
+        std::atomic<int> freed{0};
+        AtOnce(3, [&](int, OCIError*) { freed += OCIHandleFree(session, OCI_HTYPE_SESSION) == OCI_SUCCESS; });
+        ASSERT_EQ(freed, 1) << "round " << round;
+    }
 }
 
 }  // namespace

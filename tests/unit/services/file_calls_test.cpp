@@ -63,22 +63,23 @@ TEST_F(FileCalls, CreateFlagsAndModes) {
     const struct { const char* name; ub4 mode, create; sb4 answer; const char* after; } cases[] = {
         {"missing", OCI_FILE_READ_ONLY, OCI_FILE_EXIST, 30152, ""},
         {"missing", OCI_FILE_READ_WRITE, OCI_FILE_EXIST, 30152, ""},
-        {"made", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 0, "+"},
-        {"made2", OCI_FILE_READ_WRITE, OCI_FILE_EXCL, 0, "+"},
+        {"made", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 0, "+"}, {"made2", OCI_FILE_READ_WRITE, OCI_FILE_EXCL, 0, "+"},
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_EXIST, 0, "+ld"},
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 0, "+ld"},
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_EXCL, 30151, "old"},
         {"there", OCI_FILE_READ_WRITE, OCI_FILE_TRUNCATE, 0, "+"},
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_APPEND, 0, "old+"},
-        {"there", OCI_FILE_READ_WRITE, OCI_FILE_APPEND, 0, "old+"},
-        {"there", 0, OCI_FILE_CREATE, 30150, "old"},
-        {"there", 4, OCI_FILE_CREATE, 30150, "old"},
-        {"there", static_cast<ub4>(-128), OCI_FILE_CREATE, 30150, "old"},
+        {"there", OCI_FILE_READ_WRITE, OCI_FILE_APPEND, 0, "old+"}, {"there", 0, OCI_FILE_CREATE, 30150, "old"},
+        {"there", 4, OCI_FILE_CREATE, 30150, "old"}, {"there", static_cast<ub4>(-128), OCI_FILE_CREATE, 30150, "old"},
         {"there", OCI_FILE_READ_WRITE, 16, 30150, "old"},
         {"there", OCI_FILE_READ_WRITE, static_cast<ub4>(-128), 30150, "old"},
-        {".", OCI_FILE_READ_ONLY, OCI_FILE_EXIST, 30158, ""},
-        {".", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 30158, ""},
+        {".", OCI_FILE_READ_ONLY, OCI_FILE_EXIST, 30158, ""}, {".", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 30158, ""},
         {"no/such/folder", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 30152, ""}};
+    const auto descriptors = [] {
+        const std::filesystem::directory_iterator all("/proc/self/fd");
+        return std::distance(begin(all), end(all));
+    };
+    const auto before = descriptors();
     for (const auto& c : cases) {
         std::filesystem::remove(folder_ + "/made");
         Fill("there", "old");
@@ -90,6 +91,7 @@ TEST_F(FileCalls, CreateFlagsAndModes) {
             EXPECT_EQ(Answer(OCIFileClose(env_, err_, file)), 0);
         }
         EXPECT_EQ(FileContents(c.name), c.after) << c.name << ' ' << c.mode << ' ' << c.create;
+        EXPECT_EQ(descriptors(), before) << c.name << ' ' << c.mode << ' ' << c.create;
     }
 }
 
@@ -104,21 +106,15 @@ TEST_F(FileCalls, SeeksFromEveryOriginInBothDirections) {
     Fill("digits", "0123456789");
     OCIFileObject* file = MustOpen("digits", OCI_FILE_READ_ONLY, OCI_FILE_EXIST);
     const struct { uword origin; ubig_ora offset; int direction; sb4 answer; const char* next; } cases[] = {
-        {OCI_FILE_SEEK_BEGINNING, 3, OCI_FILE_FORWARD, 0, "3"},
-        {OCI_FILE_SEEK_CURRENT, 2, OCI_FILE_FORWARD, 0, "6"},
-        {OCI_FILE_SEEK_CURRENT, 3, OCI_FILE_BACKWARD, 0, "4"},
-        {OCI_FILE_SEEK_END, 1, OCI_FILE_BACKWARD, 0, "9"},
-        {OCI_FILE_SEEK_END, 10, OCI_FILE_BACKWARD, 0, "0"},
-        {OCI_FILE_SEEK_END, 5, OCI_FILE_FORWARD, 0, ""},
+        {OCI_FILE_SEEK_BEGINNING, 3, OCI_FILE_FORWARD, 0, "3"}, {OCI_FILE_SEEK_CURRENT, 2, OCI_FILE_FORWARD, 0, "6"},
+        {OCI_FILE_SEEK_CURRENT, 3, OCI_FILE_BACKWARD, 0, "4"}, {OCI_FILE_SEEK_END, 1, OCI_FILE_BACKWARD, 0, "9"},
+        {OCI_FILE_SEEK_END, 10, OCI_FILE_BACKWARD, 0, "0"}, {OCI_FILE_SEEK_END, 5, OCI_FILE_FORWARD, 0, ""},
         {OCI_FILE_SEEK_BEGINNING, 0, OCI_FILE_BACKWARD, 0, "0"},
         {OCI_FILE_SEEK_BEGINNING, 1, OCI_FILE_BACKWARD, 30150, "1"},
         {OCI_FILE_SEEK_END, 11, OCI_FILE_BACKWARD, 30150, "2"},
-        {OCI_FILE_SEEK_CURRENT, 4, OCI_FILE_BACKWARD, 30150, "3"},
-        {0, 1, OCI_FILE_FORWARD, 30150, "4"},
-        {4, 1, OCI_FILE_FORWARD, 30150, "5"},
-        {static_cast<uword>(-128), 1, OCI_FILE_FORWARD, 30150, "6"},
-        {OCI_FILE_SEEK_CURRENT, 1, 0, 30150, "7"},
-        {OCI_FILE_SEEK_CURRENT, 1, 128, 30150, "8"},
+        {OCI_FILE_SEEK_CURRENT, 4, OCI_FILE_BACKWARD, 30150, "3"}, {0, 1, OCI_FILE_FORWARD, 30150, "4"},
+        {4, 1, OCI_FILE_FORWARD, 30150, "5"}, {static_cast<uword>(-128), 1, OCI_FILE_FORWARD, 30150, "6"},
+        {OCI_FILE_SEEK_CURRENT, 1, 0, 30150, "7"}, {OCI_FILE_SEEK_CURRENT, 1, 128, 30150, "8"},
         {OCI_FILE_SEEK_BEGINNING, ~ubig_ora{0}, OCI_FILE_FORWARD, 30150, "9"}};
     for (const auto& c : cases) {
         const sword code = OCIFileSeek(env_, err_, file, c.origin, c.offset, static_cast<sb1>(c.direction));

@@ -256,6 +256,11 @@ TEST_F(Executing, OpenQueryOutlivesCommitAndOtherStatements) {
     ASSERT_EQ(Execute(0), 0) << "executing again begins anew";
     ASSERT_EQ(Fetch(), 0);
     EXPECT_EQ(value, 1);
+    stmt = other;
+    MustRun("insert into t values(4)");
+    stmt = query;
+    EXPECT_EQ(Fetch(), 0);
+    EXPECT_EQ(value, 2) << "whatever was read ahead before";
 }
 
 TEST_F(Executing, LogoffEndsWhatIsOpen) {

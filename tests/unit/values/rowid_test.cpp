@@ -7,11 +7,8 @@ namespace {
 
 TEST(RowIdText, GoesBothWays) {
     const struct { rowid::RowId value; const char* text; } cases[] = {
-        {{0, 0}, "AAAAAAAAAAAAAAAAAA"},
-        {{0, 1}, "AAAAAAAAAAAAAAAAAB"},
-        {{1, 64}, "AAAAABAAAAAAAAAABA"},
-        {{0xFFFFFFFF, -1}, "D/////AP//////////"},
-        {{7, INT64_MAX}, "AAAAAHAH//////////"},
+        {{0, 0}, "AAAAAAAAAAAAAAAAAA"}, {{0, 1}, "AAAAAAAAAAAAAAAAAB"}, {{1, 64}, "AAAAABAAAAAAAAAABA"},
+        {{0xFFFFFFFF, -1}, "D/////AP//////////"}, {{7, INT64_MAX}, "AAAAAHAH//////////"},
         {{7, INT64_MIN}, "AAAAAHAIAAAAAAAAAA"}};
     for (const auto& c : cases) {
         char text[rowid::kTextLength];
