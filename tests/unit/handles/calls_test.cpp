@@ -260,6 +260,7 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 3114);
     EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
+    EXPECT_EQ(LogOn(&svc, "test", "ann", "wrong"), 1017);
     EXPECT_EQ(LogOn(&svc, "test", "ann", "secret"), 0) << "the context is still there";
     EXPECT_EQ(svc, first);
     EXPECT_EQ(OCIHandleFree(svc, OCI_HTYPE_SVCCTX), OCI_SUCCESS);

@@ -189,8 +189,10 @@ TEST(NumberArithmetic, RangeAndDomainErrors) {
 }
 
 TEST(NumberArithmetic, BytesThatAreNoNumber) {
-    const OCINumber malformed[] = {{{0, 128}},         {{22, 193, 2}},    {{255, 193, 2}},     {{1, 129}},
-                                   {{1, 193}},         {{2, 193, 0}},     {{2, 193, 102}},     {{2, 255, 102}},
+    const OCINumber malformed[] = {{{0, 128}},         {{255, 193, 2}},   {{1, 129}},          {{1, 193}},
+                                   // One digit too many, if what lies behind were one.
+                                   {{22, 193, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2}},
+                                   {{2, 193, 0}},      {{2, 193, 102}},   {{2, 255, 102}},
                                    {{3, 193, 2, 255}}, {{3, 62, 1, 102}}, {{3, 62, 103, 102}}, {{2, 62, 102}}};
     for (const OCINumber& value : malformed) {
         OCINumber got;

@@ -122,6 +122,7 @@ TEST(NumberFromText, EveryElement) {
     EXPECT_EQ(Parsed("1.234,5", "9G999D9", kGerman), "1234.5");
     EXPECT_EQ(Parsed("\xE2\x82\xAC" "12", "L99", kGerman), "12");
     EXPECT_EQ(Parsed("12EUR", "99C", kGerman), "12");
+    EXPECT_EQ(Parsed("12DM", "99U", kGerman), "12");
 }
 
 TEST(NumberFromText, TextsThatDoNotFit) {
