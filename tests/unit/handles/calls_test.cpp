@@ -1,11 +1,10 @@
 // The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good
 // arguments, with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
-#include <atomic>
 #include <fstream>
 #include <functional>
-#include <thread>
 #include <vector>
 
+#include "support/at_once.h"
 #include "support/call_fixture.h"
 
 namespace {
@@ -430,91 +429,25 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
 }
 
-sword Execute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, const char* sql, ub4 iterations) {
-    const sword rc = OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
-    return rc == OCI_SUCCESS ? OCIStmtExecute(svc, stmt, err, iterations, 0, nullptr, nullptr, OCI_DEFAULT) : rc;
-}
-
-TEST_F(CallsTest, BreakFromAnotherThreadStopsTheRunningCall) {
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
-    auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-    auto* other_err = New<OCIError>(OCI_HTYPE_ERROR);
-    std::thread breaker([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(100));
-        EXPECT_EQ(OCIBreak(svc, other_err), OCI_SUCCESS);
-    });
-    EXPECT_EQ(Answer(Execute(svc, stmt, err_, "with recursive r(n) as (select 1 union all select n + 1 from r) "
-                                              "select max(n) from r", 0)), 1013);
-    breaker.join();
-    EXPECT_EQ(Answer(OCIReset(svc, err_)), 0);
-    EXPECT_EQ(Answer(Execute(svc, stmt, err_, "select 1 from dual", 0)), 0);
-    EXPECT_EQ(Answer(OCIBreak(svc, err_)), 0) << "idle";
-    EXPECT_EQ(Answer(OCIReset(svc, err_)), 0);
-    EXPECT_EQ(Answer(Execute(svc, stmt, err_, "select 1 from dual", 0)), 0) << "the reset has taken the break away";
-}
-
-// In a threaded environment the calls on one session take turns.
-TEST_F(CallsTest, OneSessionInManyThreads) {
-    OCIEnv* env = NewEnvironment(OCI_THREADED);
-    auto* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(":memory:"), 8), OCI_SUCCESS);
-    auto* stmt = NewHandle<OCIStmt>(env, OCI_HTYPE_STMT);
-    ASSERT_EQ(Execute(svc, stmt, err, "create table t(n number)", 1), OCI_SUCCESS);
-    std::atomic<int> wrong{0};
-    std::vector<std::thread> threads;
-    for (int number = 0; number < 4; ++number) {
-        threads.emplace_back([&] {
-            auto* own_err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
-            auto* own = NewHandle<OCIStmt>(env, OCI_HTYPE_STMT);
-            for (int round = 0; round < 50; ++round) {
-                wrong += Execute(svc, own, own_err, "insert into t values(1)", 1) != OCI_SUCCESS;
-                wrong += Execute(svc, own, own_err, "select n from t", 0) != OCI_SUCCESS;
-            }
-            wrong += OCIHandleFree(own, OCI_HTYPE_STMT) != OCI_SUCCESS;
-        });
-    }
-    for (std::thread& thread : threads) thread.join();
-    EXPECT_EQ(wrong, 0);
-    sb8 count = 0;
-    OCIDefine* define = nullptr;
-    ASSERT_EQ(OCIStmtPrepare(stmt, err, Text("select count(*) from t"), 22, OCI_NTV_SYNTAX, OCI_DEFAULT), OCI_SUCCESS);
-    ASSERT_EQ(
-        OCIDefineByPos(stmt, &define, err, 1, &count, sizeof count, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT),
-        0);
-    ASSERT_EQ(OCIStmtExecute(svc, stmt, err, 1, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
-    EXPECT_EQ(count, 200);
-    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-}
-
 // Handles come and go in many threads while others are looked up: growth of the set of living objects included.
 TEST_F(CallsTest, HandlesFromManyThreads) {
-    OCIEnv* env = NewEnvironment(OCI_THREADED);
-    std::atomic<int> wrong{0};
-    std::vector<std::thread> threads;
-    for (int number = 0; number < 8; ++number) {
-        threads.emplace_back([&, number] {
-            OCIError* err = nullptr;
-            OCISvcCtx* svc = nullptr;
-            wrong += OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&err), OCI_HTYPE_ERROR, 0, nullptr) != OCI_SUCCESS;
-            const std::string file = Folder() + "/t" + std::to_string(number) + ".db";
-            wrong += OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(file.c_str()), Length(file.c_str())) !=
-                     OCI_SUCCESS;
-            std::vector<dvoid*> handles(600);
-            for (int round = 0; round < 3; ++round) {
-                for (dvoid*& handle : handles)
-                    wrong += OCIHandleAlloc(env, &handle, OCI_HTYPE_TRANS, 0, nullptr) != OCI_SUCCESS;
-                for (dvoid*& handle : handles) wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_SUCCESS;
-                for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env, &handle, 99, 0, nullptr) != OCI_ERROR;
-                wrong += OCIPing(svc, err, 0) != OCI_SUCCESS;
-            }
-            wrong += OCILogoff(svc, err) != OCI_SUCCESS;
-        });
-    }
-    for (std::thread& thread : threads) thread.join();
-    EXPECT_EQ(wrong, 0);
-    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+    Reopen(OCI_THREADED);
+    AtOnce(8, [&](int number) {
+        auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+        OCISvcCtx* svc = nullptr;
+        const std::string file = Folder() + "/t" + std::to_string(number) + ".db";
+        EXPECT_EQ(OCILogon(env_, err, &svc, nullptr, 0, nullptr, 0, Text(file), static_cast<ub4>(file.size())), 0);
+        std::vector<dvoid*> handles(600);
+        int wrong = 0;
+        for (int round = 0; round < 3; ++round) {
+            for (dvoid*& handle : handles)
+                wrong += OCIHandleAlloc(env_, &handle, OCI_HTYPE_TRANS, 0, nullptr) != OCI_SUCCESS;
+            for (dvoid*& handle : handles) wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_SUCCESS;
+            for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env_, &handle, 99, 0, nullptr) != OCI_ERROR;
+            wrong += OCIPing(svc, err, 0) != OCI_SUCCESS;
+        }
+        EXPECT_EQ(wrong + OCILogoff(svc, err), 0);
+    });
 }
 
 }  // namespace

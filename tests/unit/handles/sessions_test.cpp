@@ -127,47 +127,6 @@ TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
     }
 }
 
-// The database of a server in memory lives as long as the server is attached.
-TEST_F(Sessions, AServerInMemoryKeepsItsDatabaseBetweenSessions) {
-    OCIServer* server = NewServer(":memory:");
-    auto* session = New<OCISession>(OCI_HTYPE_SESSION);
-    OCISvcCtx* svc = NewContext(server, session);
-    const auto begin = [&](std::string password) {
-        EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char*>("ann"), 3, OCI_ATTR_USERNAME, err_)),
-                  0);
-        EXPECT_EQ(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, password.data(),
-                                    static_cast<ub4>(password.size()), OCI_ATTR_PASSWORD, err_)), 0);
-        return Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0));
-    };
-    ASSERT_EQ(begin("secret"), 0);
-    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
-    ASSERT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 0);
-    EXPECT_EQ(begin("wrong"), 1017);
-    EXPECT_EQ(begin({"secret\0x", 8}), 1017);
-    EXPECT_EQ(Run(svc, "select n from t"), 1012);
-    ASSERT_EQ(begin("secret"), 0);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 0) << "the table is still there";
-    ASSERT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 0);
-}
-
-TEST_F(Sessions, PasswordIsChangedForGoodOrNotAtAll) {
-    OCISvcCtx* svc = nullptr;
-    const auto change = [&] {
-        return Answer(OCIPasswordChange(svc, err_, Text("ann"), 3, Text("secret"), 6, Text("new"), 3, OCI_DEFAULT));
-    };
-    ASSERT_EQ(LogOn(&svc, "x", "ann", "secret"), 0);
-    ASSERT_EQ(Run(svc, "create table t(n integer)"), 0);
-    ASSERT_EQ(Run(svc, "insert into t values(1)"), 0);
-    EXPECT_EQ(change(), 24754);
-    EXPECT_EQ(Run(svc, "update kelp_accounts set password = ''"), 1031);
-    ASSERT_EQ(Run(svc, "rollback"), 0);
-    EXPECT_EQ(change(), 0);
-    ASSERT_EQ(Run(svc, "rollback"), 0);
-    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
-    EXPECT_EQ(LogOn(&svc, "x", "ann", "secret"), 1017);
-    EXPECT_EQ(LogOn(&svc, "x", "ann", "new"), 0);
-}
-
 TEST_F(Sessions, BreakMeetsOneCall) {
     OCISvcCtx* svc = nullptr;
     ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
@@ -196,6 +155,7 @@ TEST_F(Sessions, AttributesFollowWhatHappens) {
     EXPECT_EQ(open(), 1u);
     ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
     EXPECT_EQ(open(), 0u);
+    EXPECT_EQ(Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION), nullptr);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 0u) << "goes with the logon";
 
     auto* server = New<OCIServer>(OCI_HTYPE_SERVER);

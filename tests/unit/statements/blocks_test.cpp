@@ -189,6 +189,8 @@ TEST_F(Blocks, RowsReturnedByTheLastExecution) {
         ASSERT_EQ(BindName("a", Int(in)) + BindName(&(bind = nullptr), "b", Int(back)), 0);
         EXPECT_EQ(Execute(3, c.mode), c.answer);
         EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), c.returned) << in[0] << in[1] << in[2];
+        EXPECT_NE(Execute(3, c.mode), 0) << "again: all of them are there";
+        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), 0u) << in[0] << in[1] << in[2];
     }
 }
 

@@ -283,6 +283,10 @@ TEST_F(Executing, RowIdOfTheLastChange) {
     EXPECT_EQ(One("select a from t where rowid = '" + One("select rowid from t where a = 9") + "'"), "9");
     char text[19] = "";
     ASSERT_EQ(Query("select rowid from t where a = 7", {Text(text)}), 0);
+    sb4 length = 0;    // one bind is a row id there and a text here
+    ASSERT_EQ(Prepare("select length(:r) from t where rowid = :r and a = 7"), 0);
+    ASSERT_EQ(BindName("r", Text(text)) + Define(1, Int(length)) + Execute(1), 0);
+    EXPECT_EQ(length, 18);
     ASSERT_EQ(Ready("delete from t where rowid = :r", {Text(text)}), 0);
     ASSERT_EQ(Execute(), 0);
     EXPECT_EQ(RowCount(), 1u);

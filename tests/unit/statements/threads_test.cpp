@@ -115,29 +115,4 @@ TEST_F(Threads, StatementsMoveBetweenSessions) {
     EXPECT_EQ(OCILogoff(second, err), OCI_SUCCESS);
 }
 
-// A session ends and begins anew while statements execute on its context: each answers, none is torn.
-TEST_F(Threads, ExecuteBesideLogoff) {
-    std::atomic<bool> done = false;
-    OCISvcCtx* context = nullptr;
-    ASSERT_EQ(Logon(&context), OCI_SUCCESS);
-    std::thread executing([&] {
-        StatementCalls own = Another();
-        own.svc = context;
-        Note(own.Prepare("select 1 from dual"));
-        while (!done) {
-            const sb4 answer = own.Execute(0);
-            Note(answer != 0 && answer != 3114 && answer != 1012);
-        }
-    });
-    for (int round = 0; round < 200 && !HasFailure(); ++round) {
-        EXPECT_EQ(OCILogoff(context, err), OCI_SUCCESS);
-        OCISvcCtx* same = context;
-        EXPECT_EQ(Logon(&same), OCI_SUCCESS);
-        EXPECT_EQ(same, context);
-    }
-    done = true;
-    executing.join();
-    EXPECT_EQ(failures, 0);
-}
-
 }  // namespace
