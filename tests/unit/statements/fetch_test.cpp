@@ -57,8 +57,9 @@ TEST_F(Fetching, WhatIsWrongWithTheCall) {
     EXPECT_EQ(Fetch(0), 0) << "gives the rest up";
     EXPECT_EQ(Fetch(), 1002);
     ASSERT_EQ(Execute(0), 0);
-    ASSERT_EQ(Define(3, Int(ids_)), 0);
+    ASSERT_EQ(Define(65535, Int(ids_)), 0);
     EXPECT_EQ(Fetch(), 1007);
+    for (const ub4 position : {0u, 65536u}) EXPECT_EQ(Define(position, Int(ids_)), 24308) << position;
     ASSERT_EQ(Query("select id from t", {}, 0), 0);
     EXPECT_EQ(Fetch(), 24374) << "no defines";
     EXPECT_EQ(Query("select * from missing", {}, 0), 942);
@@ -169,8 +170,8 @@ TEST_F(Fetching, Scrolling) {
         EXPECT_EQ(Delivered(), c.delivered) << index;
         EXPECT_EQ(Attribute<ub4>(OCI_ATTR_CURRENT_POSITION), c.position) << index;
     }
-    EXPECT_EQ(RowCount(), 7u);
     EXPECT_EQ(Fetch(1, OCI_FETCH_ABSOLUTE, 3), 0);
+    EXPECT_EQ(RowCount(), 7u) << "as far as it went";
     EXPECT_EQ(indicators_[0], -1);
 }
 
@@ -193,6 +194,12 @@ TEST_F(Fetching, ArrayOfStructures) {
     EXPECT_EQ(rows[2].indicator, -1);
     EXPECT_EQ(rows[2].code, 1405);
     EXPECT_EQ(std::string(rows[1].name, rows[1].length), "row 2");
+    sb8 ids[3] = {};
+    sb2 indicators[3] = {9, 9, 9};
+    char names[3][8];
+    ASSERT_EQ(Define(&id, 1, Int(ids)) + Define(&name, 2, Text(names, indicators)) + Execute(3), 0) << "plain arrays again";
+    EXPECT_EQ(ids[2], 3);
+    EXPECT_TRUE(indicators[1] == 0 && indicators[2] == -1) << indicators[1] << indicators[2];
 }
 
 TEST_F(Fetching, DefinesMayBeMadeAnewAndFreed) {

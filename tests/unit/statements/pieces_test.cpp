@@ -140,6 +140,23 @@ TEST_F(PieceByPiece, ExecuteAsksForEachValueOfEachRow) {
               "1:first and last:0102/2:-:03");
 }
 
+// A piece that was set for a bind that is made anew since is none of the next operation's; a name's bind is asked once.
+TEST_F(PieceByPiece, BindsMadeAnewAskAnew) {
+    MustRun("create table u(a varchar2(9), b varchar2(9), c varchar2(9))");
+    OCIBind *x = nullptr, *y = nullptr;
+    ASSERT_EQ(Prepare("insert into u values(:x, :y, :x)"), 0);
+    for (const char* data : {"pq", "ab"}) {
+        ASSERT_EQ(BindName(&x, "x", InPieces(SQLT_CHR)) + BindName(&y, "y", InPieces(SQLT_CHR)), 0);
+        ub4 length = 1;
+        for (int value = 0; value < 2; ++value) {
+            ASSERT_EQ(ExecuteCode(), OCI_NEED_DATA) << data[value];
+            ASSERT_EQ(Set(data + value, &length, OCI_ONE_PIECE), 0);
+        }
+    }
+    EXPECT_EQ(ExecuteCode(), OCI_SUCCESS);
+    EXPECT_EQ(One("select a || b || c from u"), "aba");
+}
+
 TEST_F(PieceByPiece, NothingIsWanted) {
     sb4 number = 0;
     ub4 length = 1;

@@ -109,7 +109,7 @@ struct StatementCalls {
     sb4 BindName(OCIBind** bind, std::string_view name, const Area& area, ub4 most = 0, ub4* current = nullptr) {
         const std::string text = Encoded(name);
         return Answer(OCIBindByName(stmt, bind, err, Bytes(text), static_cast<sb4>(text.size()), area.value, area.size,
-                                    area.type, area.indicators, area.lengths, area.codes, most, current, OCI_DEFAULT));
+                                    area.type, area.indicators, area.lengths, area.codes, most, current, area.mode));
     }
     sb4 BindName(std::string_view name, const Area& area, ub4 most = 0, ub4* current = nullptr) {
         OCIBind* bind = nullptr;

@@ -76,6 +76,8 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
         EXPECT_EQ(length_, c.length) << Shown(c.expression, c.type, c.size);
         EXPECT_EQ(indicator_, c.indicator) << Shown(c.expression, c.type, c.size);
     }
+    EXPECT_EQ(Hex(Out("printf('%.*c', 70000, 'x')", SQLT_VCS, 70002).substr(0, 3)), "FFFF78") << "all that it can tell";
+    EXPECT_EQ(indicator_, -2);
     EXPECT_EQ(Out("'0ag'", SQLT_BIN, 4), "!1465");
     EXPECT_EQ(Out("12", SQLT_BIN, 4), "!932");
 }
@@ -128,6 +130,7 @@ TEST_F(Conversions, OtherNumbers) {
     EXPECT_EQ(Out("'0.1'", SQLT_FLT, 8), Raw(0.1));
     EXPECT_EQ(Out("0.1", SQLT_FLT, 4), Raw(0.1f));
     EXPECT_EQ(Out("1e39", SQLT_FLT, 4), "!1426");
+    EXPECT_EQ(Out("9e999", SQLT_FLT, 4), Raw(std::numeric_limits<float>::infinity()));
     EXPECT_EQ(Out("3", SQLT_IBDOUBLE, 8), Raw(3.0));
     EXPECT_EQ(Out("0.1 + 0.2", SQLT_FLT, 8), Raw(0.1 + 0.2)) << "as the engine has it";
     EXPECT_EQ(Out("0.1 + 0.2", SQLT_NUM, 22), Out("'0.3'", SQLT_NUM, 22));
