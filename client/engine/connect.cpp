@@ -4,8 +4,8 @@
 #include <string>
 
 #include "engine/engine.h"
+#include "engine/postgres/postgres.h"
 #include "engine/sqlite/sqlite.h"
-#include "handles/errors.h"
 #include "platform/ini.h"
 
 namespace engine {
@@ -41,8 +41,8 @@ std::string FileOf(std::string_view database) {
 
 Status Open(std::string_view name, std::unique_ptr<Database>& database) {
     if (name.empty()) name = kDefaultName;
-    const bool is_remote = IsUrl(name) || !UrlOf(name).empty();
-    if (is_remote) return Error(errors::kNoDriver, "no PostgreSQL engine in this build");
+    const std::string url = IsUrl(name) ? std::string(name) : UrlOf(name);
+    if (!url.empty()) return postgres::Open(url, database);
     return sqlite::Open(FileOf(name), database);
 }
 

@@ -15,6 +15,7 @@ struct Dialect {
     struct Spelling {
         std::string_view written;    // a word of the application's, lower case; several words with one blank between
         std::string_view engine;     // what the engine knows for it
+        bool drops_size = false;     // of a type: what stands in parentheses behind it is left out
     };
     std::string (*placeholder)(std::size_t number);    // from 1: ?1, $1
     std::span<const Spelling> types;         // replaced as whole words in definition statements and casts
@@ -28,6 +29,7 @@ struct Dialect {
     bool cuts_for_update = false;            // "for update ..." is left out
     std::string (*date_literal)(const date::DateTime& value) = nullptr;    // for date '...' and timestamp '...'
     std::string (*row_id_literal)(const RowId& row) = nullptr;             // for a row id's text
+    std::string_view row_id = {};            // for "rowid", a row's own column
 };
 
 }  // namespace engine

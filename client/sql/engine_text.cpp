@@ -114,7 +114,9 @@ private:
         const bool in_type_size = !open_.empty() && open_.back().is_type_size;
         if (in_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
         if (token.Is("default") && names_columns_ && !defines_code_) VisitDefault(index);
-        if (token.Is("dual") && Previous(index).Is("from") && !dialect_.dual.empty()) {
+        if (token.Is("rowid") && !dialect_.row_id.empty() && !Previous(index).Is("as")) {
+            Replace(token, token.End(), dialect_.row_id);
+        } else if (token.Is("dual") && Previous(index).Is("from") && !dialect_.dual.empty()) {
             std::string table(dialect_.dual);
             Replace(token, token.End(), FollowedByAlias(index) ? table : table + " as dual");
         } else if (token.Is("minus") && At(tokens_, index + 1).Is("select") && !dialect_.minus.empty()) {
@@ -232,6 +234,7 @@ private:
             end = index + matched;
             std::string replacement(spelling.engine);
             if (matched > 1 && IsSize(index + 1)) replacement.append("(").append(tokens_[index + 2].text).append(")");
+            if (spelling.drops_size) end = BehindSize(end);
             Replace(tokens_[index], tokens_[end - 1].End(), replacement);
             break;
         }
@@ -239,6 +242,13 @@ private:
         if (CountsCharacters(end)) Insert(tokens_[end - 1].End(), dialect_.counts_characters);
         type_end_ = end;    // where the size in parentheses may follow
         return end;
+    }
+
+    // Behind what stands in parentheses at `index`, if anything does.
+    std::size_t BehindSize(std::size_t index) const {
+        if (!At(tokens_, index).Is("(")) return index;
+        while (tokens_[index].kind != TokenKind::end && !tokens_[index].Is(")")) ++index;
+        return index + (tokens_[index].kind != TokenKind::end);
     }
 
     // Whether a size in parentheses stands at `index`: "(3)".

@@ -8,6 +8,7 @@
 #include <thread>
 
 #include "engine/engine_fixture.h"
+#include "support/postgres_database.h"
 
 namespace {
 
@@ -16,14 +17,23 @@ using namespace std::chrono_literals;
 
 struct Engine {
     const char* name;
-    std::string (*fresh_database)(const std::string& folder);
+    std::string (*fresh_database)(const std::string& folder);    // null: on the server of the test run
     bool shared;    // several sessions see the same tables
 };
 void PrintTo(const Engine& engine, std::ostream* out) { *out << engine.name; }
 
 class Contract : public EngineFixture, public testing::WithParamInterface<Engine> {
 protected:
-    std::string FreshName() override { return GetParam().fresh_database(folder_); }
+    std::string FreshName() override {
+        if (GetParam().fresh_database) return GetParam().fresh_database(folder_);
+        server_ = std::make_unique<PostgresDatabase>();
+        owner_ = server_->Owner();
+        return server_->Url();
+    }
+    void TearDown() override {
+        EngineFixture::TearDown();
+        server_.reset();
+    }
     void MakeNumbers(int count = 3) {
         ASSERT_EQ(Run("create table t(n integer)"), 0);
         for (int n = 1; n <= count; ++n) ASSERT_EQ(Run("insert into t values(%1)", {Integer(n)}), 0);
@@ -40,7 +50,15 @@ protected:
         return sorted.size() == rows.size() ? sorted : "not once each: " + rows;
     }
     std::string Count() { return Query("select count(*) from t"); }
+
+    std::string owner_ = "ann";    // who may log on as such with the password secret
+    std::unique_ptr<PostgresDatabase> server_;
 };
+
+std::string Capital(std::string name) {
+    name[0] = static_cast<char>(name[0] - 'a' + 'A');
+    return name;
+}
 
 // What takes two sessions that see the same tables.
 class SharedContract : public Contract {};
@@ -61,7 +79,7 @@ TEST_P(Contract, ValuesComeBackAsTheyWent) {
     EXPECT_EQ(Query("select * from v"), row);
     EXPECT_EQ(Query("select * from v where i = %1 and n = %2 and m = %3", {values[0], values[2], values[5]}), row);
     ASSERT_EQ(Run("delete from v"), 0);
-    ASSERT_EQ(Run("insert into v values(%1, %1, %1, %1, %1, %1)", {Null()}), 0);
+    ASSERT_EQ(Run("insert into v values(%1, %2, %3, %4, %5, %6)", std::vector<Datum>(6)), 0);
     EXPECT_EQ(Query("select * from v"), "null,null,null,null,null,null;");
 }
 
@@ -297,19 +315,42 @@ TEST_P(SharedContract, LockedRowsAnswerAfterAWhile) {
     EXPECT_EQ(Run("update t set n = n + 2"), 0);
 }
 
-TEST_P(Contract, TwoPhaseIsRefusedWhereItIsNoCapability) {
-    ASSERT_FALSE(database_->GetCapabilities().two_phase) << "give engines that can tests of their own";
+TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
     ASSERT_EQ(Run("create table t(n integer)"), 0);
-    ASSERT_EQ(Run("insert into t values(1)"), 0);
-    const engine::Xid xid{.format = 1, .global_length = 1, .data = {'x'}};
-    bool read_only = false;
+    engine::Xid xid{.format = -7, .global_length = 64, .branch_length = 64, .data = {'x', '\0', '\xFF'}};
+    bool read_only = true;
     std::vector<engine::Xid> prepared;
-    EXPECT_EQ(Answer(connection_->Prepare(xid, read_only)), 1022);
-    EXPECT_EQ(Answer(connection_->CommitPrepared(xid)), 1022);
-    EXPECT_EQ(Answer(connection_->RollbackPrepared(xid)), 1022);
-    EXPECT_EQ(Answer(connection_->Recover(prepared)), 1022);
-    EXPECT_TRUE(connection_->InTransaction()) << "the transaction is as it was";
     EXPECT_EQ(database_->GetCapabilities().lobs, connection_->Lobs() != nullptr);
+    ASSERT_EQ(Run("insert into t values(1)"), 0);
+    if (!database_->GetCapabilities().two_phase) {
+        EXPECT_EQ(Answer(connection_->Prepare(xid, read_only)), 1022);
+        EXPECT_EQ(Answer(connection_->CommitPrepared(xid)), 1022);
+        EXPECT_EQ(Answer(connection_->RollbackPrepared(xid)), 1022);
+        EXPECT_EQ(Answer(connection_->Recover(prepared)), 1022);
+        EXPECT_TRUE(connection_->InTransaction()) << "the transaction is as it was";
+        return;
+    }
+    const auto other = Connect();
+    for (const bool commits : {true, false}) {
+        ASSERT_EQ(Answer(connection_->Prepare(xid, read_only)), 0);
+        EXPECT_FALSE(read_only);
+        EXPECT_FALSE(connection_->InTransaction());
+        EXPECT_EQ(All(), commits ? "" : "1;");
+        prepared.clear();
+        ASSERT_EQ(Answer(other->Recover(prepared)), 0);
+        EXPECT_EQ(prepared, std::vector{xid});
+        EXPECT_EQ(Answer(commits ? other->CommitPrepared(xid) : other->RollbackPrepared(xid)), 0);
+        EXPECT_EQ(Answer(commits ? other->CommitPrepared(xid) : other->RollbackPrepared(xid)), 24756);
+        EXPECT_EQ(All(), "1;");
+        xid.branch_length = 0;
+        ASSERT_EQ(Run("insert into t values(2)"), 0);
+    }
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
+    EXPECT_EQ(All(), "1;");
+    ASSERT_EQ(Answer(connection_->Prepare(xid, read_only)), 0);
+    EXPECT_TRUE(read_only) << "nothing was changed";
+    EXPECT_EQ(Answer(other->CommitPrepared(xid)), 24756);
 }
 
 // ---- Open queries
@@ -612,17 +653,17 @@ TEST_P(Contract, ConnectionObeysWhomItServes) {
 
 TEST_P(Contract, RefusedUserLosesNothing) {
     connection_.reset();
-    ASSERT_EQ(LogOn("ann", "secret"), 0) << "the first named logon makes the owner";
+    ASSERT_EQ(LogOn(owner_, "secret"), 0) << "the first named logon makes the owner";
     const auto ann = [&] {
         std::unique_ptr<engine::Connection> connection;
-        EXPECT_EQ(Answer(database_->Connect({"Ann", "secret", false}, stop_, connection)), 0);
+        EXPECT_EQ(Answer(database_->Connect({Capital(owner_), "secret", false}, stop_, connection)), 0);
         return connection;
     };
     connection_ = ann();
     ASSERT_EQ(Run("create table kept(n integer)"), 0);
     connection_.reset();
-    const struct { const char* user; std::string password; } refused[] = {
-        {"ann", "Secret"}, {"ann", std::string("secret\0x", 8)}, {"ann", ""}, {"bob", "secret"}};
+    const struct { std::string user, password; } refused[] = {
+        {owner_, "Secret"}, {owner_, std::string("secret\0x", 8)}, {owner_, ""}, {"bob", "secret"}};
     for (const auto& c : refused) EXPECT_EQ(LogOn(c.user, c.password), 1017) << c.user << ' ' << c.password;
     connection_ = ann();
     EXPECT_EQ(Query("select count(*) from kept"), "0;") << "the tables are there after wrong passwords";
@@ -630,23 +671,23 @@ TEST_P(Contract, RefusedUserLosesNothing) {
 
 TEST_P(Contract, PasswordChangeIsForGood) {
     connection_.reset();
-    ASSERT_EQ(LogOn("ann", "secret"), 0);
-    ASSERT_EQ(Answer(database_->Connect({"ann", "secret", false}, stop_, connection_)), 0);
-    const struct { const char* user; const char* old_password; std::string new_password; int number; } refused[] = {
-        {"ann", "wrong", "new", 28008}, {"bob", "secret", "new", 1017},
-        {"ann", "secret", std::string("a\0b", 3), 1017}};
+    ASSERT_EQ(LogOn(owner_, "secret"), 0);
+    ASSERT_EQ(Answer(database_->Connect({owner_, "secret", false}, stop_, connection_)), 0);
+    const struct { std::string user, old_password, new_password; int number; } refused[] = {
+        {owner_, "wrong", "new", 28008}, {"bob", "secret", "new", 1017},
+        {owner_, "secret", std::string("a\0b", 3), 1017}};
     for (const auto& c : refused) {
         EXPECT_EQ(Answer(connection_->ChangePassword(c.user, c.old_password, c.new_password)), c.number) << c.user;
     }
     ASSERT_EQ(Run("create table t(n integer)"), 0);
     ASSERT_EQ(Run("insert into t values(1)"), 0);
-    EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "new")), 24754) << "a rollback would undo it";
+    EXPECT_EQ(Answer(connection_->ChangePassword(owner_, "secret", "new")), 24754) << "a rollback would undo it";
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
-    EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "new")), 0);
+    EXPECT_EQ(Answer(connection_->ChangePassword(owner_, "secret", "new")), 0);
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
     connection_.reset();
-    EXPECT_EQ(LogOn("ann", "secret"), 1017);
-    EXPECT_EQ(LogOn("ann", "new"), 0);
+    EXPECT_EQ(LogOn(owner_, "secret"), 1017);
+    EXPECT_EQ(LogOn(owner_, "new"), 0);
 }
 
 TEST_P(Contract, AnotherConnectionIsOfTheSameUserAndSeparate) {
@@ -682,7 +723,7 @@ TEST_P(Contract, ConnectionOutlivesItsDatabase) {
 }
 
 TEST_P(Contract, DatabaseServesAnyNumberOfThreads) {
-    ASSERT_EQ(LogOn("ann", "secret"), 0);
+    ASSERT_EQ(LogOn(owner_, "secret"), 0);
     std::atomic<int> failures = 0;
     std::vector<std::thread> threads;
     for (int thread = 0; thread < 4; ++thread) {
@@ -760,9 +801,10 @@ std::string InMemory(const std::string&) { return ":memory:"; }
 
 constexpr Engine kSqliteFile{"SqliteFile", FreshFile, true};
 constexpr Engine kSqliteMemory{"SqliteMemory", InMemory, false};
+constexpr Engine kPostgres{"Postgres", nullptr, true};
 std::string NameOf(const testing::TestParamInfo<Engine>& info) { return info.param.name; }
 
-INSTANTIATE_TEST_SUITE_P(Engines, Contract, testing::Values(kSqliteFile, kSqliteMemory), NameOf);
-INSTANTIATE_TEST_SUITE_P(Engines, SharedContract, testing::Values(kSqliteFile), NameOf);
+INSTANTIATE_TEST_SUITE_P(Engines, Contract, testing::Values(kSqliteFile, kSqliteMemory, kPostgres), NameOf);
+INSTANTIATE_TEST_SUITE_P(Engines, SharedContract, testing::Values(kSqliteFile, kPostgres), NameOf);
 
 }  // namespace

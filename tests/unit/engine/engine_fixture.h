@@ -154,12 +154,15 @@ protected:
         std::unique_ptr<engine::Connection> connection;
         return Answer(database_->Connect({user, password, false}, stop_, connection));
     }
-    // Placeholders are written %1, %2.
+    // Placeholders are written %1, %2; a row's own column is the dialect's.
     std::string Spelled(std::string_view sql) const {
         std::string text;
+        const std::string_view row_id = database_->GetDialect().row_id;
         for (std::size_t at = 0; at < sql.size(); ++at) {
             const bool is_placeholder = sql[at] == '%' && at + 1 < sql.size() && sql[at + 1] >= '1' && sql[at + 1] <= '9';
-            if (is_placeholder) text += database_->GetDialect().placeholder(static_cast<std::size_t>(sql[++at] - '0'));
+            const bool is_row_id = !row_id.empty() && sql.substr(at).starts_with("rowid");
+            if (is_row_id) text += row_id, at += 4;
+            else if (is_placeholder) text += database_->GetDialect().placeholder(static_cast<std::size_t>(sql[++at] - '0'));
             else text += sql[at];
         }
         return text;

@@ -265,11 +265,11 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
     EXPECT_EQ(OCIHandleFree(svc, OCI_HTYPE_SVCCTX), OCI_SUCCESS);
 
     svc = nullptr;
-    std::ofstream(Folder() + "/kelpcli.ini") << "[Remote]\nurl = postgresql://host/db\n";
+    std::ofstream(Folder() + "/kelpcli.ini") << "[Remote]\nurl = postgresql:///db?host=/no/such\n";
     const struct { const char* user; const char* password; const char* database; sb4 number; } refused[] = {
         {"ann", "wrong", "test", 1017}, {"bob", "secret", "test", 1017}, {"ann", nullptr, "test", 1005},
         {nullptr, "secret", "test", 1017}, {"ann", "secret", "no/such/folder", 12154},
-        {"ann", "secret", "postgres://host/db", 21520}, {"ann", "secret", "remote", 21520}};
+        {"ann", "secret", "postgres:///db?host=/no/such", 12541}, {"ann", "secret", "remote", 12541}};
     for (const auto& c : refused) {
         EXPECT_EQ(LogOn(&svc, c.database, c.user, c.password), c.number) << c.database;
         EXPECT_EQ(svc, nullptr) << "nothing is made by a logon that fails";

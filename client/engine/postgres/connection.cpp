@@ -1,0 +1,312 @@
+// Compiling, transactions, marks and savepoints.
+#include "engine/postgres/connection.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <new>
+#include <utility>
+
+#include "engine/postgres/query.h"
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+constexpr const char* kSetGuard = "savepoint kelp_guard";
+constexpr const char* kUndoGuard = "rollback to savepoint kelp_guard";
+constexpr const char* kDropGuard = "release savepoint kelp_guard";
+constexpr std::size_t kForgottenAtOnce = 20;
+
+constexpr const char* kBegins[] = {"begin", "begin isolation level repeatable read, read only",
+                                   "begin isolation level serializable"};
+
+// A command with a mark's name in it; without memory.
+struct MarkText {
+    char text[48];
+    MarkText(const char* command, unsigned mark) { std::snprintf(text, sizeof text, "%s kelp_mark_%u", command, mark); }
+};
+
+}  // namespace
+
+PgConnection::PgConnection(std::shared_ptr<Home> home, Credentials credentials, std::unique_ptr<class Wire> wire)
+    : home_(std::move(home)), credentials_(std::move(credentials)), wire_(std::move(wire)) {
+    wire_->notices = &notices_;
+}
+
+PgConnection::~PgConnection() = default;    // the server rolls back what is open
+
+Status PgConnection::Stopped() { return Refused(errors::kCancelled); }
+
+// ---- Making way
+
+Status PgConnection::Enter() {
+    if (wire_->Broken()) return wire_->Lost();
+    if (streaming_) streaming_->ReadAhead();
+    if (forgotten_.size() < kForgottenAtOnce) return wire_->Broken() ? wire_->Lost() : Status();
+    for (const std::string& name : forgotten_) wire_->Send(("deallocate " + name).c_str());
+    wire_->Sync();
+    forgotten_.clear();
+    return wire_->Drain();
+}
+
+Status PgConnection::Enter(Effect effect) {
+    if (effect != Effect::defines) return Enter();
+    not_null_.clear();
+    if (Status status = Commit(); status.Failed()) return status;
+    return Enter();
+}
+
+void PgConnection::Note() noexcept {
+    const PGTransactionStatusType state = wire_->Transaction();
+    in_transaction_ = !wire_->Broken() && (state == PQTRANS_INTRANS || state == PQTRANS_INERROR);
+    if (!in_transaction_) savepoints_.clear();
+}
+
+PgConnection::Guard PgConnection::SendGuard(bool needs) noexcept {
+    if (in_transaction_) {
+        wire_->Send(kSetGuard);
+        wire_->Flush();
+        return Guard::savepoint;
+    }
+    if (!needs) return Guard::none;
+    wire_->Send(kBegins[0]);
+    return Guard::began;
+}
+
+// A stop that met the savepoint would leave nothing to go back to: only what follows is stopped.
+Status PgConnection::PassGuard(Guard guard) noexcept {
+    if (guard == Guard::began) return wire_->Pass(1);
+    const Wire::Heeding undisturbed(*wire_, false);
+    return guard == Guard::none ? Status() : wire_->Pass(1);
+}
+
+void PgConnection::SendRelease(Guard guard) noexcept {
+    if (guard == Guard::savepoint) wire_->Send(kDropGuard);
+    wire_->Sync();
+}
+
+Status PgConnection::Settle(Guard guard, Status status) noexcept {
+    const Wire::Heeding undisturbed(*wire_, false);
+    Note();
+    if (status.Ok() || !in_transaction_) return guard == Guard::savepoint && status.Failed() ? RolledBack(status) : status;
+    if (guard == Guard::savepoint) {
+        wire_->Send(kUndoGuard);
+        wire_->Send(kDropGuard);
+        wire_->Sync();
+        const Status undone = wire_->Drain();
+        Note();
+        return undone.Ok() ? status : Lose(status);
+    }
+    if (guard == Guard::none && wire_->Transaction() == PQTRANS_INTRANS) return status;
+    (void)wire_->Run("rollback");
+    Note();
+    return guard == Guard::none ? RolledBack(status) : status;
+}
+
+// The server has given the transaction up with a failure.
+Status PgConnection::Lose(const Status& failure) noexcept {
+    (void)wire_->Run("rollback");
+    Note();
+    return RolledBack(failure);
+}
+
+Status PgConnection::DropGuard() noexcept { return wire_->Run(kDropGuard); }
+
+// ---- Statements
+
+Status PgConnection::Compile(const StatementSource& source, std::unique_ptr<Query>& query,
+                             std::uint32_t& error_offset) {
+    try {
+        if (Status status = Enter(); !status.Ok()) return status;
+        auto made = std::make_unique<PgQuery>(*this, source);
+        if (Status status = made->Prepare(error_offset); !status.Ok()) return status;
+        query = std::move(made);
+        return {};
+    } catch (const std::bad_alloc&) {
+        (void)wire_->Drain();
+        return Refused(errors::kOutOfMemory);
+    }
+}
+
+std::string PgConnection::NewName() { return "kelp_" + std::to_string(++names_); }
+
+// There is nothing to be done about a name that no memory is left for: it stays with the server until the session ends.
+void PgConnection::Forget(const std::string& name) noexcept try {
+    if (!name.empty() && !wire_->Broken()) forgotten_.push_back(name);
+} catch (const std::bad_alloc&) {
+}
+
+Status PgConnection::Ask(const char* sql, const std::vector<std::string>& values, Result& result) {
+    if (Status status = Enter(); !status.Ok()) return status;
+    std::vector<const char*> data;
+    for (const std::string& value : values) data.push_back(value.c_str());
+    wire_->SendQuery(sql, data);
+    wire_->Sync();
+    Status status = wire_->Drain(&result);
+    Note();
+    return status.Ok() || !in_transaction_ ? status : Lose(status);
+}
+
+Status PgConnection::NotNull(Oid table, std::vector<bool>& columns) {
+    if (const auto known = not_null_.find(table); known != not_null_.end()) {
+        columns = known->second;
+        return {};
+    }
+    Result result;
+    Status status = Ask("select attnum from pg_catalog.pg_attribute where attrelid = $1::oid and attnotnull and attnum > 0",
+                        {std::to_string(table)}, result);
+    for (int row = 0; status.Ok() && row < PQntuples(result.get()); ++row) {
+        const auto place = static_cast<std::size_t>(std::stoul(PQgetvalue(result.get(), row, 0)));
+        if (columns.size() <= place) columns.resize(place + 1);
+        columns[place] = true;
+    }
+    if (status.Ok()) not_null_[table] = columns;
+    return status;
+}
+
+// ---- Transactions
+
+// The server takes the picture of what a transaction sees with its first question: that is asked at once.
+Status PgConnection::Begin(TransactionMode mode) {
+    if (Status status = Enter(); !status.Ok() || in_transaction_) return status;
+    wire_->Send(kBegins[static_cast<std::size_t>(mode)]);
+    if (mode != TransactionMode::read_write) wire_->Send("select 1");
+    wire_->Sync();
+    return Settle(Guard::began, wire_->Drain());
+}
+
+// A constraint that was deferred and fails at the end undoes the transaction.
+Status PgConnection::Commit() {
+    if (wire_->Broken()) return wire_->Lost();
+    if (!in_transaction_) return {};
+    if (Status status = Enter(); !status.Ok()) return status;
+    Status status = wire_->Run("commit");
+    Note();
+    const bool violated = status.Number() == 1 || status.Number() == errors::kParentMissing ||
+                          status.Number() == errors::kChildFound || status.Number() == errors::kCheckViolated;
+    return violated && !in_transaction_ ? Refused(errors::kRolledBack, status.Detail()) : status;
+}
+
+Status PgConnection::Rollback() {
+    if (wire_->Broken()) return wire_->Lost();
+    if (!in_transaction_) return {};
+    if (Status status = Enter(); !status.Ok()) return status;
+    Status status = wire_->Run("rollback");
+    Note();
+    return status;
+}
+
+Status PgConnection::Ping() {
+    if (Status status = Enter(); !status.Ok()) return status;
+    wire_->Sync();
+    return wire_->Drain();
+}
+
+// ---- Marks
+
+std::size_t PgConnection::LastMark() const noexcept {
+    const auto found = std::find_if(savepoints_.rbegin(), savepoints_.rend(),
+                                    [](const Savepoint& savepoint) { return savepoint.mark != 0; });
+    return found == savepoints_.rend() ? savepoints_.size()
+                                       : static_cast<std::size_t>(savepoints_.rend() - found) - 1;
+}
+
+Status PgConnection::SetMark() {
+    if (Status status = Enter(); !status.Ok()) return status;
+    savepoints_.reserve(savepoints_.size() + 1);
+    const Guard guard = in_transaction_ ? Guard::none : Guard::began;
+    if (guard == Guard::began) wire_->Send(kBegins[0]);
+    const MarkText command("savepoint", ++marks_);
+    wire_->Send(command.text);
+    wire_->Sync();
+    Status status = Settle(guard, wire_->Drain());
+    if (status.Ok()) savepoints_.push_back({{}, marks_});
+    return status;
+}
+
+Status PgConnection::UndoToMark() {
+    const std::size_t mark = LastMark();
+    if (mark == savepoints_.size()) return Refused(errors::kNoSuchSavepoint);
+    if (Status status = Enter(); !status.Ok()) return status;
+    Status status = wire_->Run(MarkText("rollback to savepoint", savepoints_[mark].mark).text);
+    Note();
+    if (!status.Ok()) return Lose(status);
+    savepoints_.erase(savepoints_.begin() + static_cast<std::ptrdiff_t>(mark) + 1, savepoints_.end());
+    return status;
+}
+
+// With savepoints behind it the server's stays, for its end would be theirs.
+Status PgConnection::DropMark() {
+    const std::size_t mark = LastMark();
+    if (mark == savepoints_.size()) return Refused(errors::kNoSuchSavepoint);
+    if (Status status = Enter(); !status.Ok()) return status;
+    Status status;
+    if (mark + 1 == savepoints_.size()) status = wire_->Run(MarkText("release savepoint", savepoints_[mark].mark).text);
+    Note();
+    if (!status.Ok()) return Lose(status);
+    savepoints_.erase(savepoints_.begin() + static_cast<std::ptrdiff_t>(mark));
+    return status;
+}
+
+// ---- Savepoints of applications
+
+namespace {
+
+// The next word of a text, as the server reads it; a quoted one with its quotes.
+std::string TakeWord(std::string_view& text) {
+    while (!text.empty() && (text.front() == ' ' || text.front() == '\t' || text.front() == '\n')) text.remove_prefix(1);
+    std::string word;
+    const bool quoted = text.starts_with('"');
+    while (!text.empty()) {
+        const char c = text.front();
+        const bool ends = quoted ? c == '"' && word.size() > 0 : c == ' ' || c == '\t' || c == '\n' || c == ';';
+        if (ends && !quoted) break;
+        word += !quoted && c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+        text.remove_prefix(1);
+        if (ends) break;
+    }
+    return word;
+}
+
+}  // namespace
+
+PgConnection::SavepointCommand PgConnection::ReadSavepoint(std::string_view sql) {
+    using Verb = SavepointCommand::Verb;
+    const std::string first = TakeWord(sql);
+    const bool sets = first == "savepoint";
+    if (!sets && first != "rollback" && first != "release") return {};
+    std::string word = TakeWord(sql);
+    if (first == "rollback") {
+        if (word == "work" || word == "transaction") word = TakeWord(sql);
+        if (word != "to") return {};
+        word = TakeWord(sql);
+    }
+    if (!sets && word == "savepoint") word = TakeWord(sql);
+    if (word.empty()) return {};
+    return {sets ? Verb::set : first == "rollback" ? Verb::undo : Verb::drop, word};
+}
+
+Status PgConnection::CheckSavepoint(const SavepointCommand& command) {
+    if (command.verb == SavepointCommand::Verb::set) {
+        savepoints_.reserve(savepoints_.size() + 1);
+        return {};
+    }
+    const bool known = std::any_of(savepoints_.begin(), savepoints_.end(),
+                                   [&](const Savepoint& savepoint) { return savepoint.name == command.name; });
+    return known ? Status() : Refused(errors::kNoSuchSavepoint);
+}
+
+// The server has done it: what stands behind a savepoint is gone with it.
+void PgConnection::NoteSavepoint(const SavepointCommand& command) {
+    if (command.verb == SavepointCommand::Verb::set) {
+        savepoints_.push_back({command.name, 0});
+        return;
+    }
+    const auto found = std::find_if(savepoints_.rbegin(), savepoints_.rend(),
+                                    [&](const Savepoint& savepoint) { return savepoint.name == command.name; });
+    if (found == savepoints_.rend()) return;
+    const auto kept = found.base() - (command.verb == SavepointCommand::Verb::drop ? 1 : 0);
+    savepoints_.erase(kept, savepoints_.end());
+}
+
+}  // namespace engine::postgres

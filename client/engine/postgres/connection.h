@@ -1,0 +1,121 @@
+// One user's session on a PostgreSQL server: transactions, marks and savepoints, the rows that still come, stopping.
+//
+// A statement that runs in a transaction with work in it has a savepoint under it, since the server gives a transaction
+// up with any error: what fails goes back to that one. Savepoints of applications are known here by name, so that going
+// back to one that is not there asks nobody.
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "engine/engine.h"
+#include "engine/postgres/home.h"
+#include "engine/postgres/wire.h"
+
+namespace engine::postgres {
+
+class PgQuery;
+
+class PgConnection final : public Connection {
+public:
+    PgConnection(std::shared_ptr<Home> home, Credentials credentials, std::unique_ptr<Wire> wire);
+    ~PgConnection() override;
+    PgConnection(const PgConnection&) = delete;
+    PgConnection& operator=(const PgConnection&) = delete;
+
+    Status ChangePassword(const std::string& user, const std::string& old_password,
+                          const std::string& new_password) override;
+    Status Compile(const StatementSource& source, std::unique_ptr<Query>& query, std::uint32_t& error_offset) override;
+    Status OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) override;
+    Status Begin(TransactionMode mode) override;
+    Status Commit() override;
+    Status Rollback() override;
+    [[nodiscard]] bool InTransaction() const override { return in_transaction_; }
+    Status SetMark() override;
+    Status UndoToMark() override;
+    Status DropMark() override;
+    Status Prepare(const Xid& xid, bool& read_only) override;
+    Status CommitPrepared(const Xid& xid) override;
+    Status RollbackPrepared(const Xid& xid) override;
+    Status Recover(std::vector<Xid>& prepared) override;
+    Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
+    void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { wire_->Obey(std::move(stop)); }
+    Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
+    LobStore* Lobs() override { return nullptr; }
+    Status Ping() override;
+    [[nodiscard]] bool Broken() const override { return wire_->Broken(); }
+    void Interrupt() noexcept override { wire_->Wake(); }
+
+    // ---- For queries and descriptions
+
+    [[nodiscard]] Wire& Server() { return *wire_; }
+    [[nodiscard]] static Status Stopped();
+    // By table: its columns that take no null, as they were when first asked for.
+    Status NotNull(Oid table, std::vector<bool>& columns);
+    // Makes way for something else: has the query whose rows still come read them ahead, and forgets what closed queries
+    // have left with the server. 3114 on a broken connection.
+    Status Enter();
+    // The same, and ends a transaction before a definition.
+    Status Enter(Effect effect);
+
+    // A statement of the application's, from its first command to the end of its batch. Guarded ones have a savepoint.
+    enum class Guard : std::uint8_t { none, began, savepoint };
+    // Sends what stands before the statement: the beginning of a transaction that it needs (`needs`), or a savepoint.
+    Guard SendGuard(bool needs) noexcept;
+    // Reads the answers to that. What follows may be stopped.
+    Status PassGuard(Guard guard) noexcept;
+    // Sends what stands behind it and closes the batch.
+    void SendRelease(Guard guard) noexcept;
+    // Once the batch is read: goes back to where the guard stood if it has failed, and tells whether the transaction was
+    // lost with it.
+    Status Settle(Guard guard, Status status) noexcept;
+    // Ends the savepoint of a statement whose batch ended before it.
+    Status DropGuard() noexcept;
+
+    // A savepoint statement of the application's: 1086 where it names none.
+    struct SavepointCommand {
+        enum class Verb : std::uint8_t { none, set, undo, drop } verb = Verb::none;
+        std::string name;    // as the server has it
+    };
+    static SavepointCommand ReadSavepoint(std::string_view sql);
+    Status CheckSavepoint(const SavepointCommand& command);
+    void NoteSavepoint(const SavepointCommand& command);
+
+    // Names that prepared statements have on this connection, and the end of one.
+    std::string NewName();
+    void Forget(const std::string& name) noexcept;
+
+    // The query whose rows still come; one at most.
+    void Stream(PgQuery* query) noexcept { streaming_ = query; }
+    [[nodiscard]] bool Streams(const PgQuery* query) const { return streaming_ == query; }
+
+    // Rows of a question of the engine's own, with texts as values.
+    Status Ask(const char* sql, const std::vector<std::string>& values, Result& result);
+
+private:
+    [[nodiscard]] std::size_t LastMark() const noexcept;    // its place; the count of savepoints: there is none
+    Status Lose(const Status& failure) noexcept;
+    Status FinishPrepared(const char* verb, const Xid& xid);
+    void Note() noexcept;    // what the server says of the transaction
+
+    std::shared_ptr<Home> home_;
+    Credentials credentials_;
+    std::unique_ptr<Wire> wire_;
+    bool in_transaction_ = false;
+    struct Savepoint {
+        std::string name;         // empty: a mark
+        unsigned mark = 0;        // its number, which stands in the server's name for it
+    };
+    std::vector<Savepoint> savepoints_;    // from the outermost
+    unsigned marks_ = 0;
+    std::vector<std::string> forgotten_;     // prepared statements that nobody has any more
+    std::uint64_t names_ = 0;
+    std::map<Oid, std::vector<bool>> not_null_;
+    PgQuery* streaming_ = nullptr;
+};
+
+}  // namespace engine::postgres

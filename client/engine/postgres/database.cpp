@@ -1,0 +1,143 @@
+// A PostgreSQL server that a server handle is attached to: its dialect, its sessions.
+#include <memory>
+#include <string>
+
+#include "engine/postgres/binary.h"
+#include "engine/postgres/connection.h"
+#include "engine/postgres/home.h"
+#include "engine/postgres/postgres.h"
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+// Types that the server has others for. A date has a time here, and a whole number as many digits as any.
+constexpr Dialect::Spelling kTypes[] = {
+    {"number", "numeric"},
+    {"varchar2", "varchar"},
+    {"nvarchar2", "varchar"},
+    {"nchar", "char"},
+    {"binary_float", "real"},
+    {"binary_double", "double precision"},
+    {"integer", "numeric(38)"},
+    {"int", "numeric(38)"},
+    {"smallint", "numeric(38)"},
+    {"decfloat", "numeric", true},
+    {"float", "numeric", true},
+    {"long raw", "bytea"},
+    {"long", "text"},
+    {"raw", "bytea", true},
+    {"blob", "bytea"},
+    {"clob", "text"},
+    {"nclob", "text"},
+    {"dbclob", "text"},
+    {"date", "timestamp(0)"},
+    {"rowid", "tid"},
+    {"timestamp with local time zone", "timestamptz"},
+    {"timestamp with time zone", "timestamptz"},
+};
+
+// The moment of the statement; the server's own words mean that of the transaction.
+constexpr Dialect::Spelling kFunctions[] = {
+    {"sysdate", "date_trunc('second', statement_timestamp()::timestamp)::timestamp(0)"},
+    {"current_date", "date_trunc('second', statement_timestamp()::timestamp)::timestamp(0)"},
+    {"systimestamp", "statement_timestamp()"},
+    {"current_timestamp", "statement_timestamp()"},
+    {"localtimestamp", "statement_timestamp()::timestamp"},
+};
+
+std::string Placeholder(std::size_t number) { return '$' + std::to_string(number); }
+
+std::string DateLiteral(const date::DateTime& value) {
+    char text[date::kMaxEngineText];
+    const std::string written(text, date::ToEngineText(value, text));
+    return (value.has_zone ? "timestamptz '" : "timestamp '") + written + "'";
+}
+
+std::string RowIdLiteral(const RowId& row) {
+    char bytes[kTupleIdSize];
+    TupleIdOf(row, bytes);
+    return "'(" + std::to_string(Get<std::uint32_t>(bytes)) + "," + std::to_string(Get<std::uint16_t>(bytes + 4)) + ")'::tid";
+}
+
+class PgDatabase final : public Database {
+public:
+    explicit PgDatabase(std::shared_ptr<Home> home) : home_(std::move(home)) {}
+
+    [[nodiscard]] const Dialect& GetDialect() const override;
+    [[nodiscard]] const Capabilities& GetCapabilities() const override;
+    std::string Version() override { return home_->Version(); }
+    Status Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
+                   std::unique_ptr<Connection>& connection) override;
+
+private:
+    const std::shared_ptr<Home> home_;
+};
+
+const Dialect& PgDatabase::GetDialect() const {
+    static constexpr Dialect kDialect{
+        .placeholder = Placeholder,
+        .types = kTypes,
+        .functions = kFunctions,
+        .casts = {},
+        .counts_characters = {},
+        .dual = "(select 'X' as dummy)",
+        .minus = "except",
+        .truncate_table = {},
+        .date_literal = DateLiteral,
+        .row_id_literal = RowIdLiteral,
+        .row_id = "ctid",
+    };
+    return kDialect;
+}
+
+// Whether transactions can be prepared is a setting of the server's.
+const Capabilities& PgDatabase::GetCapabilities() const {
+    static constexpr Capabilities kOnePhase{.sequences = true, .typed_parameters = true};
+    static constexpr Capabilities kTwoPhase{
+        .two_phase = true, .prepared_survives = true, .sequences = true, .typed_parameters = true};
+    return home_->TwoPhase() ? kTwoPhase : kOnePhase;
+}
+
+Status PgDatabase::Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
+                           std::unique_ptr<Connection>& connection) {
+    std::unique_ptr<Wire> wire;
+    Status status = home_->Connect(credentials, std::move(stop), wire);
+    if (status.Ok()) connection = std::make_unique<PgConnection>(home_, credentials, std::move(wire));
+    return status;
+}
+
+}  // namespace
+
+Status PgConnection::Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) {
+    std::unique_ptr<class Wire> wire;
+    Status status = home_->Connect(credentials_, std::move(stop), wire);
+    if (status.Ok()) connection = std::make_unique<PgConnection>(home_, credentials_, std::move(wire));
+    return status;
+}
+
+// A query over the rows of a cursor of the transaction: its name, which is quoted, for it may be any.
+Status PgConnection::OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) {
+    if (cursor.kind != Kind::cursor) return Refused(errors::kInconsistentTypes);
+    std::string sql = "fetch all from \"";
+    for (const char c : cursor.Text()) sql.append(c == '"' ? 2 : 1, c);
+    sql += '"';
+    std::unique_ptr<Query> made;
+    std::uint32_t offset = 0;
+    if (Status status = Compile({sql, Effect::reads, {}}, made, offset); !status.Ok()) return status;
+    struct : RowSource {
+        Status Row(std::uint32_t, std::span<Datum>) override { return {}; }
+    } none;
+    if (Status status = made->Open(none, {}); !status.Ok()) return status;
+    query = std::move(made);
+    return {};
+}
+
+Status Open(const std::string& url, std::unique_ptr<Database>& database) {
+    auto home = std::make_shared<Home>(url);
+    Status status = home->Attach();
+    if (status.Ok()) database = std::make_unique<PgDatabase>(std::move(home));
+    return status;
+}
+
+}  // namespace engine::postgres

@@ -1,0 +1,91 @@
+// Connecting: parameters, settings of a session, what the server tells of itself.
+#include "engine/postgres/home.h"
+
+#include <utility>
+
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+// Texts come in UTF-8 and dates in the form that is read here; a lock is waited for as long as on other engines, unless
+// the URL says otherwise. What follows is what the server tells of itself.
+constexpr const char* kPrime =
+    "select pg_catalog.set_config('client_encoding', 'UTF8', false), pg_catalog.set_config('datestyle', 'ISO, DMY', false),"
+    " pg_catalog.set_config('bytea_output', 'hex', false),"
+    " pg_catalog.set_config('standard_conforming_strings', 'on', false),"
+    " case when pg_catalog.current_setting('lock_timeout') = '0'"
+    " then pg_catalog.set_config('lock_timeout', '2000', false) end,"
+    " pg_catalog.current_setting('server_version'), pg_catalog.current_setting('max_prepared_transactions')::int > 0,"
+    " pg_catalog.version()";
+enum : int { kServerVersion = 5, kTwoPhase = 6, kBanner = 7 };
+
+constexpr const char* kUnknownVersion = "10 or later, PostgreSQL: nobody has logged on yet";
+
+}  // namespace
+
+std::string RoleName(std::string_view name) {
+    std::string role;
+    if (name.size() >= 2 && name.front() == '"' && name.back() == '"') return role.assign(name.substr(1, name.size() - 2));
+    for (const char c : name) role += static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    return role;
+}
+
+// A refused user is an answer, too.
+Status Home::Attach() {
+    std::unique_ptr<Wire> wire;
+    Status status = Log({"", "", true}, nullptr, wire);
+    if (status.Number() == errors::kBadLogon) return {};
+    const std::lock_guard lock(mutex_);
+    spare_ = std::move(wire);
+    return status;
+}
+
+Status Home::Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
+                     std::unique_ptr<Wire>& wire) {
+    if (credentials.external) {
+        const std::lock_guard lock(mutex_);
+        wire = std::move(spare_);
+    }
+    if (wire) {
+        wire->Obey(stop);
+        wire->Sync();
+        if (wire->Drain().Ok()) return {};
+        wire.reset();    // it has waited for too long
+    }
+    return Log(credentials, std::move(stop), wire);
+}
+
+Status Home::Log(const Credentials& credentials, std::shared_ptr<const StopRequest> stop, std::unique_ptr<Wire>& wire) {
+    const bool has_zero = (credentials.user + credentials.password).find('\0') != std::string::npos;
+    if (has_zero) return Refused(errors::kBadLogon);
+    Parameters parameters{{{"dbname", url_}, {"fallback_application_name", "libkelpci"}, {"client_encoding", "UTF8"}}};
+    if (!credentials.external) {
+        parameters.values.emplace_back("user", RoleName(credentials.user));
+        parameters.values.emplace_back("password", credentials.password);
+    }
+    std::unique_ptr<Wire> made;
+    Status status = Wire::Connect(parameters, std::move(stop), made);
+    if (status.Ok()) status = Prime(*made);
+    if (status.Ok()) wire = std::move(made);
+    return status;
+}
+
+Status Home::Prime(Wire& wire) {
+    Result result;
+    Status status = wire.Run(kPrime, &result);
+    if (!status.Ok()) return status;
+    const auto column = [&](int index) { return std::string(PQgetvalue(result.get(), 0, index)); };
+    two_phase_.store(column(kTwoPhase) == "t", std::memory_order_relaxed);
+    const std::string version = column(kServerVersion) + " KELP server engine, " + column(kBanner);
+    const std::lock_guard lock(mutex_);
+    version_ = version;
+    return status;
+}
+
+std::string Home::Version() {
+    const std::lock_guard lock(mutex_);
+    return version_.empty() ? kUnknownVersion : version_;
+}
+
+}  // namespace engine::postgres

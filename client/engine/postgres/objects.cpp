@@ -1,0 +1,167 @@
+// Describing tables, views, sequences, schemas and the database, from the catalogue; changing passwords.
+#include <libpq-fe.h>
+
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include "engine/postgres/connection.h"
+#include "engine/postgres/types.h"
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+// A word or a quoted one, perhaps with its schema's before it. False for anything else.
+bool ReadName(std::string_view text, std::vector<std::string>& parts) {
+    const auto is_letter = [](char c) {
+        return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' || c == '$' ||
+               c == '#' || (c & 0x80) != 0;
+    };
+    for (std::size_t at = 0;; ++at) {
+        std::string part;
+        if (at < text.size() && text[at] == '"') {
+            const std::size_t end = text.find('"', at + 1);
+            if (end == std::string_view::npos) return false;
+            part = text.substr(at, end + 1 - at);
+            at = end + 1;
+        } else {
+            while (at < text.size() && is_letter(text[at])) part += text[at++];
+        }
+        if (part.empty() || part == "\"\"" || parts.size() == 2) return false;
+        parts.push_back(std::move(part));
+        if (at == text.size()) return true;
+        if (text[at] != '.') return false;
+    }
+}
+
+// As the server has it: a word in lower case; what stands in quotes is the name that is shown.
+std::string StoredName(const std::string& part) {
+    std::string name = part;
+    if (part.starts_with('"')) {
+        name = part.substr(1, part.size() - 2);
+        if (ShownName(name) != name) return name;    // lower case, in quotes
+        for (const char c : name)
+            if (c >= 'a' && c <= 'z') return name;
+    }
+    for (char& c : name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    return name;
+}
+
+std::string Text(const Result& result, int row, int column) { return PQgetvalue(result.get(), row, column); }
+std::int64_t Integer(const Result& result, int column) {
+    return std::strtoll(PQgetvalue(result.get(), 0, column), nullptr, 10);
+}
+std::string ShownText(const Result& result, int row, int column) { return ShownName(Text(result, row, column)); }
+
+void ListNames(const Result& result, std::vector<std::string>& names) {
+    for (int row = 0; row < PQntuples(result.get()); ++row) names.push_back(ShownText(result, row, 0));
+}
+
+// The relation of that name: in the schema, or in the first one of the search path.
+constexpr const char* kFind =
+    "select c.oid, c.relkind, n.nspname, c.relname from pg_catalog.pg_class c"
+    " join pg_catalog.pg_namespace n on n.oid = c.relnamespace where c.relname = $1"
+    " and case when $2 = '' then pg_catalog.pg_table_is_visible(c.oid) else n.nspname = $2 end"
+    " and c.relkind in ('r', 'p', 'f', 'v', 'm', 'S')";
+constexpr const char* kColumns =
+    "select a.attname, coalesce(nullif(t.typbasetype, 0), t.oid), a.atttypmod, a.attnotnull from pg_catalog.pg_attribute a"
+    " join pg_catalog.pg_type t on t.oid = a.atttypid"
+    " where a.attrelid = $1::oid and a.attnum > 0 and not a.attisdropped order by a.attnum";
+constexpr const char* kSequence =
+    "select seqstart, seqincrement, seqmin, seqmax from pg_catalog.pg_sequence where seqrelid = $1::oid";
+constexpr const char* kSchema = "select nspname from pg_catalog.pg_namespace where nspname = $1";
+constexpr const char* kMembers =
+    "select c.relname from pg_catalog.pg_class c join pg_catalog.pg_namespace n on n.oid = c.relnamespace"
+    " where n.nspname = $1 and c.relkind in ('r', 'p', 'f', 'v', 'm', 'S') order by 1";
+constexpr const char* kDatabase = "select pg_catalog.current_database() where pg_catalog.current_database() = $1";
+constexpr const char* kSchemas =
+    "select nspname from pg_catalog.pg_namespace where nspname !~ '^pg_(toast|temp)' order by 1";
+
+ObjectKind KindOf(char relation) {
+    switch (relation) {
+        case 'v':
+        case 'm': return ObjectKind::view;
+        case 'S': return ObjectKind::sequence;
+        default: return ObjectKind::table;
+    }
+}
+
+}  // namespace
+
+Status PgConnection::Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) {
+    const bool wants_table = kind == ObjectKind::table || kind == ObjectKind::view;
+    const Status missing = Refused(wants_table ? errors::kNoSuchTable : errors::kNoSuchObject);
+    std::vector<std::string> parts;
+    if (!ReadName(name, parts)) return missing;
+    const std::string schema = parts.size() == 2 ? StoredName(parts[0]) : "";
+    const std::string plain = StoredName(parts.back());
+    Result found;
+    Result rows;
+    ObjectDescription described;
+    Status status;
+    if (kind == ObjectKind::schema || kind == ObjectKind::database) {
+        const bool is_schema = kind == ObjectKind::schema;
+        status = Ask(is_schema ? kSchema : kDatabase, {plain}, found);
+        if (status.Ok() && (parts.size() == 2 || PQntuples(found.get()) == 0)) return missing;
+        if (status.Ok()) status = is_schema ? Ask(kMembers, {plain}, rows) : Ask(kSchemas, {}, rows);
+        if (!status.Ok()) return status;
+        described.kind = kind;
+        described.name = ShownText(found, 0, 0);
+        ListNames(rows, described.members);
+        object = std::move(described);
+        return status;
+    }
+    status = Ask(kFind, {plain, schema}, found);
+    if (!status.Ok()) return status;
+    if (PQntuples(found.get()) == 0) return missing;
+    described.kind = KindOf(*PQgetvalue(found.get(), 0, 1));
+    if (kind != ObjectKind::any && described.kind != kind) return missing;
+    described.schema = ShownText(found, 0, 2);
+    described.name = ShownText(found, 0, 3);
+    const bool is_sequence = described.kind == ObjectKind::sequence;
+    status = Ask(is_sequence ? kSequence : kColumns, {Text(found, 0, 0)}, rows);
+    if (!status.Ok()) return status;
+    if (is_sequence && PQntuples(rows.get()) == 1) {
+        described.sequence_start = Integer(rows, 0);
+        described.sequence_step = Integer(rows, 1);
+        described.sequence_least = Integer(rows, 2);
+        described.sequence_most = Integer(rows, 3);
+    }
+    for (int row = 0; !is_sequence && row < PQntuples(rows.get()); ++row) {
+        Column& column = described.columns.emplace_back();
+        column.name = ShownText(rows, row, 0);
+        DescribeType(static_cast<Oid>(std::stoul(Text(rows, row, 1))), std::atoi(PQgetvalue(rows.get(), row, 2)), column);
+        column.nullable = Text(rows, row, 3) == "f";
+    }
+    object = std::move(described);
+    return status;
+}
+
+// ---- Passwords
+
+Status PgConnection::ChangePassword(const std::string& user, const std::string& old_password,
+                                    const std::string& new_password) {
+    if (in_transaction_) return Refused(24754, "a rollback would undo it");
+    if (new_password.find('\0') != std::string::npos) return Refused(errors::kBadLogon);
+    const std::string role = RoleName(user);
+    Result found;
+    Status status = Ask("select 1 from pg_catalog.pg_roles where rolname = $1", {role}, found);
+    if (status.Ok() && PQntuples(found.get()) == 0) status = Refused(errors::kBadLogon);
+    if (!status.Ok()) return status;
+    std::unique_ptr<class Wire> proof;
+    status = home_->Connect({user, old_password, false}, nullptr, proof);
+    if (status.Number() == errors::kBadLogon) return Refused(errors::kBadOldPassword);
+    if (!status.Ok()) return status;
+    // What is sent is what the server keeps of a password.
+    char* const kept = PQencryptPasswordConn(wire_->Libpq(), new_password.c_str(), role.c_str(), "scram-sha-256");
+    char* const name = PQescapeIdentifier(wire_->Libpq(), role.data(), role.size());
+    if (kept && name) status = wire_->Run(("alter role " + std::string(name) + " password '" + kept + "'").c_str());
+    else status = Refused(errors::kOutOfMemory);
+    PQfreemem(kept);
+    PQfreemem(name);
+    if (status.Ok() && RoleName(credentials_.user) == role) credentials_.password = new_password;
+    return status;
+}
+
+}  // namespace engine::postgres

@@ -1,0 +1,352 @@
+// Preparing and describing, and executions: one by one or in batches.
+#include "engine/postgres/query.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdlib>
+#include <new>
+
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+constexpr std::uint32_t kLargestBatch = 1000;            // rows
+constexpr std::size_t kBatchBytes = std::size_t{1} << 20;
+constexpr std::uint32_t kRowsBetweenPushes = 64;
+
+Verb VerbOf(std::string_view sql) {
+    constexpr struct {
+        std::string_view word;
+        Verb verb;
+    } kVerbs[] = {{"insert", Verb::insert}, {"update", Verb::update}, {"delete", Verb::remove}};
+    for (const auto& [word, verb] : kVerbs) {
+        const bool same = sql.size() > word.size() && std::equal(word.begin(), word.end(), sql.begin(), [](char a, char b) {
+            return a == (b >= 'A' && b <= 'Z' ? static_cast<char>(b - 'A' + 'a') : b);
+        });
+        if (same) return verb;
+    }
+    return Verb::other;
+}
+
+// Bytes from the start of a text to a character of it, from 1.
+std::uint32_t OffsetOf(std::string_view text, const char* position) {
+    auto characters = position ? std::strtoul(position, nullptr, 10) : 1;
+    std::size_t at = 0;
+    for (; characters > 1 && at < text.size(); --characters) {
+        do ++at;
+        while (at < text.size() && (text[at] & 0xC0) == 0x80);
+    }
+    return static_cast<std::uint32_t>(at);
+}
+
+std::uint64_t AffectedBy(const PGresult* result) {
+    return std::strtoull(PQcmdTuples(const_cast<PGresult*>(result)), nullptr, 10);
+}
+
+bool Failed(const PGresult* result) { return PQresultStatus(result) == PGRES_FATAL_ERROR; }
+
+Status NoMemory() { return Refused(errors::kOutOfMemory); }
+
+}  // namespace
+
+PgQuery::PgQuery(PgConnection& connection, const StatementSource& source)
+    : connection_(connection),
+      sql_(source.sql),
+      effect_(source.effect),
+      verb_(VerbOf(sql_)),
+      kinds_(source.parameters.begin(), source.parameters.end()) {
+    if (effect_ == Effect::controls) savepoint_ = PgConnection::ReadSavepoint(sql_);
+}
+
+PgQuery::~PgQuery() {
+    Close();
+    connection_.Forget(name_);
+}
+
+// ---- Preparing
+
+// What a date is compared with tells whether it goes with a zone; where that is no date at all, it is one all the same.
+bool PgQuery::RetypesTimes(std::vector<Oid>& types) const {
+    bool any = false;
+    types = bound_.Types();
+    for (std::size_t index = 0; index < std::min(types.size(), kinds_.size()); ++index) {
+        const bool misread = kinds_[index] == Kind::timestamp && types[index] != oid::kTimestamp &&
+                             types[index] != oid::kMoment;
+        types[index] = misread ? oid::kTimestamp : TypeOf(kinds_[index]);
+        any = any || misread;
+    }
+    return any;
+}
+
+Status PgQuery::Prepare(std::uint32_t& error_offset) {
+    if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return {};
+    std::vector<Oid> types;
+    for (const Kind kind : kinds_) types.push_back(TypeOf(kind));
+    Status status = PrepareAs(types, error_offset);
+    if (status.Number() == errors::kInconsistentTypes) {    // a type that nothing tells
+        std::vector<Oid> told = types;
+        for (std::size_t index = 0; index < told.size(); ++index) {
+            if (told[index] == 0) told[index] = kinds_[index] == Kind::timestamp ? oid::kTimestamp : oid::kText;
+        }
+        if (told == types) return status;
+        Status again = PrepareAs(told, error_offset);
+        return again.Ok() ? again : status;
+    }
+    if (!status.Ok() || !RetypesTimes(types)) return status;
+    return PrepareAs(types, error_offset);
+}
+
+Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset) {
+    Wire& server = connection_.Server();
+    connection_.Forget(name_);
+    name_ = connection_.NewName();
+    const PgConnection::Guard guard = connection_.SendGuard(false);
+    server.SendPrepare(name_.c_str(), sql_.c_str(), types);
+    server.SendDescribe(name_.c_str());
+    connection_.SendRelease(guard);
+    Status status = connection_.PassGuard(guard);
+    Result description;
+    for (int command = 0; status.Ok() && command < 2;) {
+        Result result = server.Next();
+        if (server.Broken()) break;
+        if (!result) ++command;
+        else if (Failed(result.get())) {
+            status = server.Answer(result.get());
+            error_offset = OffsetOf(sql_, PQresultErrorField(result.get(), PG_DIAG_STATEMENT_POSITION));
+        } else description = std::move(result);
+    }
+    Status rest = server.Drain();
+    status = connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+    if (status.Ok()) return Describe(description.get());
+    name_.clear();
+    return status;
+}
+
+// Throws before anything is changed, or the query is none.
+Status PgQuery::Describe(const PGresult* result) {
+    std::vector<Oid> types;
+    for (int index = 0; index < PQnparams(result); ++index) types.push_back(PQparamtype(result, index));
+    const int count = PQnfields(result);
+    columns_.assign(static_cast<std::size_t>(count), {});
+    rooms_.resize(columns_.size());
+    values_.resize(columns_.size());
+    readers_.resize(columns_.size());
+    parameters_.resize(types.size());
+    bound_.SetTypes(std::move(types));
+    binary_ = true;
+    has_cursors_ = false;
+    for (int index = 0; index < count; ++index) {
+        binary_ = binary_ && BinaryReader(PQftype(result, index));
+        has_cursors_ = has_cursors_ || PQftype(result, index) == oid::kCursor;
+    }
+    for (int index = 0; index < count; ++index) {
+        const auto place = static_cast<std::size_t>(index);
+        const Oid type = PQftype(result, index);
+        DescribeType(type, PQfmod(result, index), columns_[place]);
+        columns_[place].name = type == oid::kTupleId ? "ROWID" : ShownName(PQfname(result, index));
+        readers_[place] = binary_ ? BinaryReader(type) : TextReader(type);
+        const Oid table = PQftable(result, index);
+        const auto column = static_cast<std::size_t>(std::max(PQftablecol(result, index), 0));
+        if (table == 0 || column == 0) continue;
+        std::vector<bool> not_null;
+        if (Status status = connection_.NotNull(table, not_null); !status.Ok()) return status;
+        columns_[place].nullable = column >= not_null.size() || !not_null[column];
+    }
+    return {};
+}
+
+// The tables are others than they were, or somebody has thrown the server's statements away.
+bool PgQuery::IsStale(const Status& status) const {
+    return (status.Number() == errors::kSchemaChanged || status.Number() == 1003) && !connection_.Broken();
+}
+
+Status PgQuery::PrepareAnew() {
+    std::uint32_t offset = 0;
+    return Prepare(offset);
+}
+
+// ---- Executions
+
+Status PgQuery::Load(RowSource& source, std::uint32_t row) noexcept try {
+    Status status = parameters_.empty() ? Status() : source.Row(row, parameters_);
+    return status.Ok() ? bound_.Set(parameters_) : status;
+} catch (const std::bad_alloc&) {
+    return NoMemory();
+}
+
+Status PgQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) {
+    Close();
+    if (connection_.Server().Asked()) return PgConnection::Stopped();
+    outcome.failures.reserve(outcome.failures.size() + 2);
+    if (Status status = connection_.Enter(effect_); !status.Ok()) return status;
+    if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return ExecuteSavepoint(outcome);
+    if (effect_ == Effect::changes) return ExecuteRows(source, run, outcome);
+    for (std::uint32_t row = run.first; row < run.last; ++row) {
+        Status status = ExecuteOnce(source, row, outcome);
+        if (status.Ok()) continue;
+        outcome.failures.push_back({row, std::move(status)});
+        break;
+    }
+    return {};
+}
+
+// Within the transaction, if there is one.
+Status PgQuery::ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& outcome) {
+    Status status = Load(source, row);
+    if (!status.Ok()) return status;
+    Wire& server = connection_.Server();
+    for (bool again = true; again; again = IsStale(status) && PrepareAnew().Ok()) {
+        const PgConnection::Guard guard = connection_.SendGuard(false);
+        server.SendExecute(name_.c_str(), bound_.Values(), binary_);
+        connection_.SendRelease(guard);
+        const Wire::Heeding heeding(server);
+        status = connection_.PassGuard(guard);
+        Status rest = server.Drain();
+        status = connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+    }
+    if (status.Ok()) ++outcome.executed;
+    return status;
+}
+
+Status PgQuery::ExecuteSavepoint(ArrayOutcome& outcome) {
+    Status status = connection_.CheckSavepoint(savepoint_);
+    Wire& server = connection_.Server();
+    if (status.Ok()) {
+        const bool begins = !connection_.InTransaction();
+        const PgConnection::Guard guard = begins ? PgConnection::Guard::began : PgConnection::Guard::none;
+        if (begins) server.Send("begin");
+        server.Send(sql_.c_str());
+        server.Sync();
+        status = connection_.Settle(guard, server.Drain());
+        if (status.Ok()) connection_.NoteSavepoint(savepoint_);
+    }
+    if (status.Ok()) ++outcome.executed;
+    else outcome.failures.push_back({0, std::move(status)});
+    return {};
+}
+
+// ---- Arrays
+
+// A batch is all done or not done at all: of one with a failure the rows before it are run again. Rows that fail one
+// after the other make batches small. A stop holds for the row that it was met at; those before it are done.
+Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) {
+    const bool delivers = run.returned && !columns_.empty();
+    std::uint32_t size = kLargestBatch;
+    std::uint32_t stop = run.last;
+    for (std::uint32_t row = run.first; row < run.last;) {
+        const bool was_in_transaction = connection_.InTransaction();
+        const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
+        Batch batch;
+        if (row == stop) batch.refusal = PgConnection::Stopped();
+        else if (delivers) batch = RunReturning(source, row, *run.returned);
+        else batch = RunBatch(source, row, last, stop == run.last);
+        if (batch.refusal.Number() == errors::kCancelled) stop = row + batch.sent;
+        Status failure = std::move(batch.failure);
+        while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction) {
+            batch = RunBatch(source, row, row + batch.done, false);
+            if (batch.failure.Ok()) break;
+            failure = batch.failure;
+        }
+        if (batch.failure.Ok() && (failure.Ok() || batch.done > 0)) {
+            outcome.executed += batch.sent;
+            outcome.affected += batch.affected;
+            row += batch.sent;
+        }
+        size = failure.Ok() ? std::min(2 * size, kLargestBatch) : std::max(size / 8, 1U);
+        if (failure.Ok()) failure = std::move(batch.refusal);
+        if (failure.Ok()) continue;
+        if (connection_.Broken() || (was_in_transaction && !connection_.InTransaction())) return failure;
+        const bool stops = !run.all_rows || failure.Number() == errors::kCancelled;
+        outcome.failures.push_back({row, std::move(failure)});
+        if (stops) break;
+        outcome.failures.reserve(outcome.failures.size() + 2);
+        ++row;
+    }
+    return {};
+}
+
+// Sends what can be sent of the rows [first, last), and reads the answers.
+PgQuery::Batch PgQuery::RunBatch(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds) {
+    Wire& server = connection_.Server();
+    Batch batch;
+    std::size_t bytes = 0;
+    PgConnection::Guard guard = PgConnection::Guard::none;
+    for (std::uint32_t row = first; row < last && bytes < kBatchBytes; ++row) {
+        batch.refusal = Load(source, row);
+        if (batch.refusal.Ok() && heeds && server.Asked()) batch.refusal = PgConnection::Stopped();
+        batch.refused = !batch.refusal.Ok();
+        if (batch.refused) break;
+        if (batch.sent == 0) guard = connection_.SendGuard(true);
+        server.SendExecute(name_.c_str(), bound_.Values(), binary_);
+        bytes += bound_.Bytes();
+        if (++batch.sent % kRowsBetweenPushes == 0) server.Push();
+    }
+    if (batch.sent == 0) return batch;
+    connection_.SendRelease(guard);
+    const Wire::Heeding heeding(server, heeds && !batch.refused);
+    batch.failure = connection_.PassGuard(guard);
+    if (batch.failure.Ok()) ReadBatch(batch);
+    Status rest = server.Drain();
+    if (batch.failure.Ok()) batch.failure = std::move(rest);
+    batch.failure = connection_.Settle(guard, std::move(batch.failure));
+    return batch;
+}
+
+void PgQuery::ReadBatch(Batch& batch) noexcept {
+    Wire& server = connection_.Server();
+    for (batch.done = 0; batch.done < batch.sent && batch.failure.Ok();) {
+        const Result result = server.Next();
+        if (server.Broken() && !result) return;
+        if (!result) ++batch.done;
+        else if (Failed(result.get())) batch.failure = server.Answer(result.get(), verb_);
+        else batch.affected += AffectedBy(result.get());
+    }
+}
+
+// One execution with its rows, which the savepoint outlives: what the sink refuses is undone.
+PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t row, RowSink& sink) {
+    Wire& server = connection_.Server();
+    Batch batch;
+    batch.refusal = Load(source, row);
+    if (batch.refusal.Ok() && server.Asked()) batch.refusal = PgConnection::Stopped();
+    batch.refused = !batch.refusal.Ok();
+    if (batch.refused) return batch;
+    batch.sent = 1;
+    const PgConnection::Guard guard = connection_.SendGuard(true);
+    server.SendExecute(name_.c_str(), bound_.Values(), binary_);
+    server.Sync();
+    Result rows;
+    {
+        const Wire::Heeding heeding(server);
+        batch.failure = connection_.PassGuard(guard);
+        while (batch.failure.Ok() && !server.Idle() && !server.Broken()) {
+            Result result = server.Next();
+            if (!result) continue;
+            if (Failed(result.get())) batch.failure = server.Answer(result.get(), verb_);
+            else if (PQresultStatus(result.get()) == PGRES_TUPLES_OK) rows = std::move(result);
+        }
+        Status rest = server.Drain();
+        if (batch.failure.Ok()) batch.failure = std::move(rest);
+    }
+    if (batch.failure.Ok() && rows) {
+        batch.affected = AffectedBy(rows.get());
+        batch.failure = Deliver(rows.get(), row, sink);
+    }
+    if (batch.failure.Ok() && guard == PgConnection::Guard::savepoint) batch.failure = connection_.DropGuard();
+    batch.failure = connection_.Settle(guard, std::move(batch.failure));
+    return batch;
+}
+
+Status PgQuery::Deliver(const PGresult* result, std::uint32_t row, RowSink& sink) try {
+    Status status;
+    for (int index = 0; index < PQntuples(result) && status.Ok(); ++index) {
+        status = Fill(result, index);
+        if (status.Ok()) status = sink.Row(row, values_);
+    }
+    return status;
+} catch (const std::bad_alloc&) {
+    return NoMemory();
+}
+
+}  // namespace engine::postgres

@@ -1,0 +1,109 @@
+// One statement that the server has prepared: array executions in pipelined batches, and a query's rows as they come.
+//
+// Rows come one by one while nothing else is asked of the connection. Before something else is, the rest is read into
+// the store. Rows of a scrollable query are kept there as they are reached.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "engine/engine.h"
+#include "engine/postgres/connection.h"
+#include "engine/postgres/types.h"
+#include "engine/row_store.h"
+
+namespace engine::postgres {
+
+class PgQuery final : public Query {
+public:
+    PgQuery(PgConnection& connection, const StatementSource& source);
+    ~PgQuery() override;
+    PgQuery(const PgQuery&) = delete;
+    PgQuery& operator=(const PgQuery&) = delete;
+
+    // Has the server prepare the statement.
+    Status Prepare(std::uint32_t& error_offset);
+
+    const std::vector<Column>& Columns() override { return columns_; }
+    Status ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) override;
+    Status Open(RowSource& source, const QueryRun& run) override;
+    [[nodiscard]] bool IsOpen() const override { return state_ != State::closed; }
+    Status Fetch(RowSink& sink, std::uint32_t most, bool& more) override;
+    Status Scroll(std::uint64_t position, RowSink& sink, bool& found) override;
+    Status Count(std::uint64_t& rows) override;
+    void Close() noexcept override;
+
+    // Reads the rest of the rows that still come into the store. What fails is kept for the fetch that gets there.
+    void ReadAhead() noexcept;
+
+private:
+    enum class State : std::uint8_t {
+        closed,
+        on_row,     // a row has come that nobody has seen yet
+        coming,     // the next row is still to come
+        drained     // the rows to come are in store_, with end_ behind them
+    };
+    // How a batch of executions went.
+    struct Batch {
+        std::uint32_t sent = 0;        // rows
+        std::uint32_t done = 0;        // of them, before the one that failed
+        std::uint64_t affected = 0;
+        Status failure;                // of the row behind them, or of the batch
+        bool refused = false;          // the row behind those that were sent: by its source, or by a stop
+        Status refusal;
+    };
+
+    Status PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset);
+    Status Describe(const PGresult* result);
+    bool RetypesTimes(std::vector<Oid>& types) const;
+    Status PrepareAnew();
+    [[nodiscard]] bool IsStale(const Status& status) const;
+    Status Load(RowSource& source, std::uint32_t row) noexcept;
+
+    Status ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& outcome);
+    Status ExecuteSavepoint(ArrayOutcome& outcome);
+    Status ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome);
+    Batch RunBatch(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds);
+    void ReadBatch(Batch& batch) noexcept;
+    Batch RunReturning(RowSource& source, std::uint32_t row, RowSink& sink);
+    Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);
+
+    Status Start(const QueryRun& run);
+    void Leave() noexcept;
+    Status CheckOpen();
+    Status Ended(Status status) noexcept;
+    Status Next(bool& found);
+    Status Step();
+    Status Finish(Status status) noexcept;
+    Status Keep(std::uint64_t rows);
+    Status KeepRow();
+    Status Fill(const PGresult* result, int row);
+
+    PgConnection& connection_;
+    const std::string sql_;
+    const Effect effect_;
+    const Verb verb_;
+    const std::vector<Kind> kinds_;
+    PgConnection::SavepointCommand savepoint_;
+    std::string name_;                     // empty: the server has it not
+    BoundValues bound_;
+    std::vector<Datum> parameters_;
+    std::vector<Column> columns_;
+    std::vector<Reader> readers_;
+    std::vector<ValueRoom> rooms_;
+    std::vector<Datum> values_;            // the row at hand
+    bool binary_ = true;
+    bool has_cursors_ = false;
+
+    State state_ = State::closed;
+    PgConnection::Guard guard_ = PgConnection::Guard::none;
+    Result row_;                           // what the views of the row at hand show
+    bool scrollable_ = false;
+    RowStore store_;
+    std::uint64_t next_ = 0;               // the row of the store that comes next
+    Status end_;                           // what comes behind the last row
+};
+
+}  // namespace engine::postgres

@@ -1,0 +1,229 @@
+// The rows of a query: waiting for them, scrolling, reading ahead.
+#include <algorithm>
+#include <limits>
+#include <new>
+
+#include "engine/postgres/query.h"
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+constexpr int kRowsBeforeCancel = 1000;    // that a query closed early may still send before it is cancelled
+
+}  // namespace
+
+// Waits for the first row, so that what fails at once is answered here.
+Status PgQuery::Open(RowSource& source, const QueryRun& run) {
+    Close();
+    if (connection_.Server().Asked()) return PgConnection::Stopped();
+    if (Status status = connection_.Enter(effect_); !status.Ok()) return status;
+    Status status = Load(source, run.row);
+    if (status.Ok()) status = Start(run);
+    if (IsStale(status)) {
+        status = PrepareAnew();
+        if (status.Ok()) status = Load(source, run.row);
+        if (status.Ok()) status = Start(run);
+    }
+    return status;
+}
+
+// Rows are locked as they are sent, and a cursor that is a value ends with the transaction.
+Status PgQuery::Start(const QueryRun& run) {
+    Wire& server = connection_.Server();
+    guard_ = connection_.SendGuard(effect_ == Effect::locks || effect_ == Effect::changes || has_cursors_);
+    server.SendExecute(name_.c_str(), bound_.Values(), binary_);
+    connection_.SendRelease(guard_);
+    const Wire::Heeding heeding(server);
+    Status status = connection_.PassGuard(guard_);
+    if (!status.Ok()) return Finish(std::move(status));
+    server.OneByOne();
+    connection_.Stream(this);
+    state_ = State::coming;
+    scrollable_ = run.scrollable;
+    status = Step();
+    if (!status.Ok()) {
+        Close();
+        return status;
+    }
+    if (effect_ == Effect::locks) {
+        ReadAhead();
+        if (!end_.Ok()) return Ended(end_);
+    }
+    return status;
+}
+
+// Waits for the next row: on_row with it, drained behind the last one.
+Status PgQuery::Step() {
+    Wire& server = connection_.Server();
+    row_.reset();
+    for (;;) {
+        Result result = server.Next();
+        if (!result) return Finish(server.Broken() ? server.Lost() : Status());
+        const ExecStatusType status = PQresultStatus(result.get());
+        if (status == PGRES_FATAL_ERROR) return Finish(server.Answer(result.get()));
+        if (status == PGRES_SINGLE_TUPLE) {
+            row_ = std::move(result);
+            state_ = State::on_row;
+            return {};
+        }
+    }
+}
+
+// Reads what is left of the batch, and lets go of the connection.
+Status PgQuery::Finish(Status status) noexcept {
+    Status rest = connection_.Server().Drain();
+    connection_.Stream(nullptr);
+    state_ = State::drained;
+    return connection_.Settle(guard_, status.Ok() ? std::move(rest) : std::move(status));
+}
+
+Status PgQuery::CheckOpen() {
+    if (state_ == State::closed) return Refused(errors::kFetchOutOfSequence);
+    return connection_.Server().Asked() ? Ended(PgConnection::Stopped()) : Status();
+}
+
+Status PgQuery::Ended(Status status) noexcept {
+    Close();
+    return status;
+}
+
+Status PgQuery::Fetch(RowSink& sink, std::uint32_t most, bool& more) {
+    more = false;
+    const Wire::Heeding heeding(connection_.Server());
+    Status status = CheckOpen();
+    for (std::uint32_t row = 0; row < most && status.Ok(); ++row) {
+        bool found = false;
+        status = Next(found);
+        if (!status.Ok()) return Ended(std::move(status));
+        if (!found) {
+            if (!scrollable_) Close();
+            return status;
+        }
+        status = sink.Row(0, values_);
+    }
+    more = IsOpen();
+    return status;
+}
+
+// The next row as views, wherever it comes from.
+Status PgQuery::Next(bool& found) {
+    if (scrollable_ && next_ == store_.Size()) {
+        if (Status status = Keep(next_ + 1); !status.Ok()) return status;
+    }
+    if (state_ == State::coming && !scrollable_) {
+        if (connection_.Server().Asked()) return PgConnection::Stopped();
+        if (Status status = Step(); !status.Ok()) return status;
+    }
+    if (scrollable_ || state_ == State::drained) {
+        found = next_ < store_.Size();
+        Status status = found ? store_.Read(next_, values_) : end_;
+        if (found && status.Ok()) ++next_;
+        return status;
+    }
+    state_ = State::coming;
+    found = true;
+    return Fill(row_.get(), 0);
+}
+
+// Copies the next row into the store.
+Status PgQuery::KeepRow() {
+    if (state_ == State::coming) {
+        if (Status status = Step(); !status.Ok() || state_ == State::drained) return status;
+    }
+    Status status = Fill(row_.get(), 0);
+    if (status.Ok()) status = store_.Add(values_);
+    if (status.Ok()) state_ = State::coming;
+    return status;
+}
+
+// Reads on until the store has that many rows, or all.
+Status PgQuery::Keep(std::uint64_t rows) {
+    Status status;
+    while (status.Ok() && store_.Size() < rows && state_ != State::drained) status = KeepRow();
+    return status.Ok() && store_.Size() < rows ? end_ : status;
+}
+
+void PgQuery::ReadAhead() noexcept {
+    const Wire::Heeding undisturbed(connection_.Server(), false);
+    Status status;
+    try {
+        while (status.Ok() && state_ != State::drained) status = KeepRow();
+    } catch (const std::bad_alloc&) {
+        status = Refused(errors::kOutOfMemory);
+    }
+    if (!status.Ok()) end_ = std::move(status);
+    if (connection_.Streams(this)) Leave();
+}
+
+// The rest is of no use. Not much of it is passed over; a query that goes on sending is stopped, unless that undid more
+// than reading.
+void PgQuery::Leave() noexcept {
+    Wire& server = connection_.Server();
+    const Wire::Heeding undisturbed(server, false);
+    row_.reset();
+    bool more = true;
+    for (int row = 0; more && (row < kRowsBeforeCancel || effect_ != Effect::reads); ++row) more = server.Next() != nullptr;
+    if (more) server.Cancel();
+    Status rest = server.Drain();
+    connection_.Stream(nullptr);
+    state_ = State::drained;
+    (void)connection_.Settle(guard_, std::move(rest));
+}
+
+Status PgQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
+    found = false;
+    const Wire::Heeding heeding(connection_.Server());
+    Status status = CheckOpen();
+    if (!status.Ok()) return status;
+    if (!scrollable_) return Refused(errors::kFetchOutOfSequence);
+    status = Keep(position);
+    if (!status.Ok()) return Ended(std::move(status));
+    next_ = std::min(position, store_.Size());
+    if (position == 0 || position > store_.Size()) return status;
+    status = store_.Read(position - 1, values_);
+    if (!status.Ok()) return Ended(std::move(status));
+    found = true;
+    return sink.Row(0, values_);
+}
+
+Status PgQuery::Count(std::uint64_t& rows) {
+    const Wire::Heeding heeding(connection_.Server());
+    Status status = CheckOpen();
+    if (!status.Ok()) return status;
+    if (!scrollable_) return Refused(errors::kFetchOutOfSequence);
+    status = Keep(std::numeric_limits<std::uint64_t>::max());
+    if (!status.Ok()) return Ended(std::move(status));
+    rows = store_.Size();
+    return status;
+}
+
+void PgQuery::Close() noexcept {
+    if (state_ == State::closed) return;
+    if (connection_.Streams(this)) Leave();
+    store_.Clear();
+    row_.reset();
+    state_ = State::closed;
+    end_ = {};
+    next_ = 0;
+}
+
+// A row as views of the result, or of the rooms.
+Status PgQuery::Fill(const PGresult* result, int row) {
+    const int count = static_cast<int>(values_.size());
+    if (PQnfields(result) != count) return Refused(errors::kSchemaChanged);
+    for (int index = 0; index < count; ++index) {
+        const auto place = static_cast<std::size_t>(index);
+        Datum& value = values_[place];
+        if (PQgetisnull(result, row, index)) {
+            value = {};
+            continue;
+        }
+        const std::string_view bytes(PQgetvalue(result, row, index),
+                                     static_cast<std::size_t>(PQgetlength(result, row, index)));
+        if (const int error = readers_[place](bytes, rooms_[place], value)) return Refused(error);
+    }
+    return {};
+}
+
+}  // namespace engine::postgres

@@ -1,0 +1,361 @@
+// One table row a type. What has no row is a text.
+#include "engine/postgres/types.h"
+
+#include <algorithm>
+#include <array>
+#include <charconv>
+#include <cstdlib>
+
+#include "handles/errors.h"
+#include "oci.h"
+
+namespace engine::postgres {
+namespace {
+
+constexpr std::int8_t kFloating = -127;
+constexpr std::uint32_t kBytesOfCharacter = 4;    // at most, in UTF-8
+constexpr int kModifierHeader = 4;                // what the modifiers of texts and numbers are raised by
+
+void SetView(Datum& value, Kind kind, const void* data, std::size_t length) {
+    value.kind = kind;
+    value.length = static_cast<std::uint32_t>(length);
+    value.data = data;
+}
+
+// ---- Reading
+
+int ReadText(std::string_view bytes, ValueRoom&, Datum& value) {
+    if (bytes.empty()) value = {};    // an empty text is null
+    else SetView(value, Kind::text, bytes.data(), bytes.size());
+    return 0;
+}
+
+int ReadBytes(std::string_view bytes, ValueRoom&, Datum& value) {
+    if (bytes.empty()) value = {};
+    else SetView(value, Kind::bytes, bytes.data(), bytes.size());
+    return 0;
+}
+
+int GiveInteger(std::int64_t integer, Datum& value) {
+    value.kind = Kind::integer;
+    value.length = 0;
+    value.integer = integer;
+    return 0;
+}
+
+int GiveReal(double real, Datum& value) {
+    value.kind = Kind::real;
+    value.length = 0;
+    value.real = real;
+    return 0;
+}
+
+template <class T>
+int ReadInteger(std::string_view bytes, ValueRoom&, Datum& value) {
+    return GiveInteger(static_cast<std::int64_t>(Get<T>(bytes.data())), value);
+}
+
+int ReadBool(std::string_view bytes, ValueRoom&, Datum& value) { return GiveInteger(bytes[0] != 0, value); }
+
+int ReadDouble(std::string_view bytes, ValueRoom&, Datum& value) {
+    const auto bits = Get<std::uint64_t>(bytes.data());
+    double real;
+    std::memcpy(&real, &bits, sizeof real);
+    return GiveReal(real, value);
+}
+
+int ReadFloat(std::string_view bytes, ValueRoom&, Datum& value) {
+    const auto bits = Get<std::uint32_t>(bytes.data());
+    float real;
+    std::memcpy(&real, &bits, sizeof real);
+    return GiveReal(static_cast<double>(real), value);
+}
+
+int ReadNumeric(std::string_view bytes, ValueRoom& room, Datum& value) {
+    NumericValue numeric;
+    if (const int error = NumericTo(bytes, numeric)) return error;
+    if (numeric.is_integer) return GiveInteger(numeric.integer, value);
+    room.number = numeric.number;
+    SetView(value, Kind::decimal, &room.number, sizeof room.number);
+    return 0;
+}
+
+int GiveDate(int error, ValueRoom& room, Datum& value) {
+    SetView(value, Kind::timestamp, &room.date, sizeof room.date);
+    return error;
+}
+
+int ReadTimestamp(std::string_view bytes, ValueRoom& room, Datum& value) {
+    return GiveDate(MicrosecondsTo(Get<std::int64_t>(bytes.data()), room.date), room, value);
+}
+
+int ReadMoment(std::string_view bytes, ValueRoom& room, Datum& value) {
+    return GiveDate(MomentTo(Get<std::int64_t>(bytes.data()), room.date), room, value);
+}
+
+int ReadDay(std::string_view bytes, ValueRoom& room, Datum& value) {
+    room.date = {};
+    return GiveDate(DaysTo(Get<std::int32_t>(bytes.data()), room.date), room, value);
+}
+
+int ReadTupleId(std::string_view bytes, ValueRoom& room, Datum& value) {
+    room.row = RowIdOf(bytes.data());
+    SetView(value, Kind::row_id, &room.row, sizeof room.row);
+    return 0;
+}
+
+int ReadCursor(std::string_view bytes, ValueRoom&, Datum& value) {
+    SetView(value, Kind::cursor, bytes.data(), bytes.size());
+    return 0;
+}
+
+// ---- Reading texts: of a result with a column whose binary form is not known here
+
+int TextToBool(std::string_view text, ValueRoom&, Datum& value) { return GiveInteger(text == "t", value); }
+
+int TextToNumber(std::string_view text, ValueRoom& room, Datum& value) {
+    std::int64_t integer = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), integer);
+    if (error == std::errc() && end == text.data() + text.size()) return GiveInteger(integer, value);
+    SetView(value, Kind::decimal, &room.number, sizeof room.number);
+    return number::FromPlainText(text, '.', &room.number);
+}
+
+int TextToReal(std::string_view text, ValueRoom&, Datum& value) {
+    return GiveReal(std::strtod(text.data(), nullptr), value);    // libpq closes texts with a zero
+}
+
+int TextToDate(std::string_view text, ValueRoom& room, Datum& value) {
+    return GiveDate(date::FromEngineText(text, &room.date), room, value);
+}
+
+// \x and pairs of digits, read where they lie: the result is the engine's own.
+int TextToBytes(std::string_view text, ValueRoom& room, Datum& value) {
+    constexpr std::string_view kDigits = "0123456789abcdef";
+    if (text.size() <= 2) return ReadBytes({}, room, value);
+    char* const bytes = const_cast<char*>(text.data());
+    std::size_t count = 0;
+    for (std::size_t at = 2; at + 1 < text.size(); at += 2) {
+        bytes[count++] = static_cast<char>(kDigits.find(text[at]) << 4 | kDigits.find(text[at + 1]));
+    }
+    return ReadBytes({bytes, count}, room, value);
+}
+
+int TextToTupleId(std::string_view text, ValueRoom& room, Datum& value) {
+    char bytes[kTupleIdSize];
+    char* end = nullptr;
+    Put(static_cast<std::uint32_t>(std::strtoul(text.data() + 1, &end, 10)), bytes);
+    Put(static_cast<std::uint16_t>(std::strtoul(end + 1, nullptr, 10)), bytes + 4);
+    return ReadTupleId({bytes, sizeof bytes}, room, value);
+}
+
+// ---- Types
+
+struct TypeRow {
+    Oid oid;
+    Reader binary, text;
+    std::uint16_t type;
+    std::uint32_t size;
+    std::uint8_t precision;
+    std::int8_t scale;
+};
+
+constexpr std::uint32_t kNumberSize = 22, kDateSize = 7, kTimestampSize = 11, kZonedSize = 13, kRowIdSize = 18;
+constexpr Oid kChar = 18, kName = 19, kJson = 114, kXml = 142, kUnknown = 705, kFixed = 1042, kVarying = 1043;
+
+constexpr TypeRow kTypes[] = {
+    {oid::kBool, ReadBool, TextToBool, SQLT_NUM, kNumberSize, 1, 0},
+    {oid::kBytes, ReadBytes, TextToBytes, SQLT_BIN, 0, 0, 0},
+    {kChar, ReadText, ReadText, SQLT_CHR, 1, 0, 0},
+    {kName, ReadText, ReadText, SQLT_CHR, 64, 0, 0},
+    {oid::kInt8, ReadInteger<std::int64_t>, TextToNumber, SQLT_NUM, kNumberSize, 19, 0},
+    {oid::kInt2, ReadInteger<std::int16_t>, TextToNumber, SQLT_NUM, kNumberSize, 5, 0},
+    {oid::kInt4, ReadInteger<std::int32_t>, TextToNumber, SQLT_NUM, kNumberSize, 10, 0},
+    {oid::kText, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
+    {oid::kOid, ReadInteger<std::uint32_t>, TextToNumber, SQLT_NUM, kNumberSize, 10, 0},
+    {oid::kTupleId, ReadTupleId, TextToTupleId, SQLT_RDD, kRowIdSize, 0, 0},
+    {kJson, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
+    {kXml, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
+    {oid::kFloat4, ReadFloat, TextToReal, SQLT_IBFLOAT, 4, 0, 0},
+    {oid::kFloat8, ReadDouble, TextToReal, SQLT_IBDOUBLE, 8, 0, 0},
+    {kUnknown, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
+    {kFixed, ReadText, ReadText, SQLT_AFC, 0, 0, 0},
+    {kVarying, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
+    {oid::kDate, ReadDay, TextToDate, SQLT_DAT, kDateSize, 0, 0},
+    {oid::kTimestamp, ReadTimestamp, TextToDate, SQLT_TIMESTAMP, kTimestampSize, 0, 6},
+    {oid::kMoment, ReadMoment, TextToDate, SQLT_TIMESTAMP_TZ, kZonedSize, 0, 6},
+    {oid::kNumeric, ReadNumeric, TextToNumber, SQLT_NUM, kNumberSize, 0, kFloating},
+    {oid::kCursor, ReadCursor, ReadCursor, SQLT_RSET, 8, 0, 0},
+};
+
+const TypeRow* Find(Oid type) {
+    const auto* row = std::lower_bound(std::begin(kTypes), std::end(kTypes), type,
+                                       [](const TypeRow& candidate, Oid wanted) { return candidate.oid < wanted; });
+    return row != std::end(kTypes) && row->oid == type ? row : nullptr;
+}
+
+bool IsTextType(Oid type) {
+    return type == oid::kText || type == kVarying || type == kFixed || type == kName || type == kUnknown;
+}
+
+// The modifier of a number: its precision above, its scale, of eleven bits with a sign, below.
+void DescribeNumber(int modifier, Column& column) {
+    const int packed = modifier - kModifierHeader;
+    const int scale = ((packed & 0x7FF) ^ 1024) - 1024;
+    column.precision = static_cast<std::uint8_t>(std::min(packed >> 16 & 0xFFFF, 255));
+    column.scale = static_cast<std::int8_t>(std::clamp(scale, -84, 127));
+}
+
+}  // namespace
+
+void DescribeType(Oid type, int modifier, Column& column) {
+    const TypeRow* row = Find(type);
+    column.type = row ? row->type : SQLT_CHR;
+    column.size = row ? row->size : 0;
+    column.precision = row ? row->precision : 0;
+    column.scale = row ? row->scale : 0;
+    column.characters = 0;
+    if (modifier < 0) return;
+    if (type == kFixed || type == kVarying) {
+        column.characters = static_cast<std::uint32_t>(std::max(modifier - kModifierHeader, 0));
+        column.size = column.characters * kBytesOfCharacter;
+    } else if (type == oid::kNumeric) {
+        DescribeNumber(modifier, column);
+    } else if (type == oid::kTimestamp && modifier == 0) {    // how a date with its time is declared
+        column.type = SQLT_DAT;
+        column.size = kDateSize;
+        column.scale = 0;
+    } else if (type == oid::kTimestamp || type == oid::kMoment) {
+        column.scale = static_cast<std::int8_t>(modifier);
+    }
+}
+
+std::string ShownName(std::string_view name) {
+    std::string upper(name);
+    for (char& c : upper) {
+        if (c >= 'A' && c <= 'Z') return std::string(name);
+        if (c >= 'a' && c <= 'z') c = static_cast<char>(c - 'a' + 'A');
+    }
+    return upper;
+}
+
+Reader BinaryReader(Oid type) {
+    const TypeRow* row = Find(type);
+    return row ? row->binary : nullptr;
+}
+
+Reader TextReader(Oid type) {
+    const TypeRow* row = Find(type);
+    return row ? row->text : ReadText;
+}
+
+// ---- Writing
+
+Oid TypeOf(Kind kind) {
+    switch (kind) {
+        case Kind::integer: return oid::kInt8;
+        case Kind::real: return oid::kFloat8;
+        case Kind::decimal: return oid::kNumeric;
+        case Kind::bytes: return oid::kBytes;
+        case Kind::row_id: return oid::kTupleId;
+        case Kind::cursor: return oid::kCursor;
+        default: return 0;    // texts are read as what they are compared with; so are dates, with or without a zone
+    }
+}
+
+void BoundValues::SetTypes(std::vector<Oid> types) {
+    const std::size_t count = types.size();
+    rooms_.resize(count);
+    values_.data.resize(count);
+    values_.lengths.resize(count);
+    values_.formats.resize(count);
+    types_ = std::move(types);
+}
+
+void BoundValues::Point(std::size_t index, const void* data, std::size_t length, bool binary) {
+    values_.data[index] = data ? static_cast<const char*>(data) : "";
+    values_.lengths[index] = static_cast<int>(length);
+    values_.formats[index] = binary;
+    bytes_ += length;
+}
+
+Status BoundValues::Set(std::span<const Datum> values) {
+    bytes_ = 0;
+    for (std::size_t index = 0; index < types_.size(); ++index) {
+        if (values[index].kind == Kind::null) values_.data[index] = nullptr;
+        else if (const int error = Write(index, values[index])) return Refused(error);
+    }
+    return {};
+}
+
+// A text for a text goes as it lies there; for any other type it is the server that reads it, up to a zero.
+int BoundValues::WriteText(std::size_t index, std::string_view text) {
+    if (IsTextType(types_[index])) {
+        Point(index, text.data(), text.size(), true);
+        return 0;
+    }
+    std::string& room = rooms_[index];
+    room.assign(types_[index] == oid::kBytes ? "\\x" : "");
+    room.append(text);
+    if (room.find('\0') != std::string::npos) return errors::kInvalidCharacter;
+    Point(index, room.c_str(), room.size(), false);
+    return 0;
+}
+
+// A text made here.
+int BoundValues::WriteOwn(std::size_t index, std::string_view text) {
+    rooms_[index].assign(text);
+    Point(index, rooms_[index].c_str(), text.size(), false);
+    return 0;
+}
+
+int BoundValues::WriteTime(std::size_t index, const date::DateTime& value) {
+    std::int64_t microseconds = 0;
+    const Oid type = types_[index];
+    if (type != oid::kTimestamp && type != oid::kMoment) {
+        char text[date::kMaxEngineText];
+        return WriteOwn(index, {text, date::ToEngineText(value, text)});
+    }
+    const int error = type == oid::kMoment ? MomentFrom(value, microseconds) : MicrosecondsFrom(value, microseconds);
+    if (error != 0) return error;
+    std::string& room = rooms_[index];
+    room.resize(sizeof microseconds);
+    Put(microseconds, room.data());
+    Point(index, room.data(), room.size(), true);
+    return 0;
+}
+
+int BoundValues::Write(std::size_t index, const Datum& value) {
+    std::string& room = rooms_[index];
+    switch (value.kind) {
+        case Kind::integer:
+            if (types_[index] != oid::kInt8) return WriteOwn(index, std::to_string(value.integer));
+            room.resize(sizeof value.integer);
+            Put(value.integer, room.data());
+            break;
+        case Kind::real: {
+            std::uint64_t bits;
+            std::memcpy(&bits, &value.real, sizeof bits);
+            room.resize(sizeof bits);
+            Put(bits, room.data());
+            break;
+        }
+        case Kind::decimal:
+            room.resize(kMaxNumeric);
+            room.resize(NumericFrom(value.Number(), room.data()));
+            if (room.empty()) return errors::kInvalidNumber;
+            break;
+        case Kind::text: return WriteText(index, value.Text());
+        case Kind::bytes: Point(index, value.data, value.length, true); return 0;
+        case Kind::timestamp: return WriteTime(index, value.Timestamp());
+        case Kind::row_id:
+            room.resize(kTupleIdSize);
+            TupleIdOf(value.Row(), room.data());
+            break;
+        default: return errors::kInconsistentTypes;
+    }
+    Point(index, room.data(), room.size(), true);
+    return 0;
+}
+
+}  // namespace engine::postgres

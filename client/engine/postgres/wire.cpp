@@ -1,0 +1,264 @@
+// Connecting, sending, waiting and reading.
+#include "engine/postgres/wire.h"
+
+#include <poll.h>
+#include <sys/eventfd.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <new>
+
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+using namespace std::chrono_literals;
+using Clock = std::chrono::steady_clock;
+
+constexpr auto kBetweenCancels = 200ms;
+constexpr int kNoticeNumber = 20000;    // what the server, or code in it, tells in its own words
+constexpr auto kForever = Clock::time_point::max();
+
+bool IsError(const PGresult* result) {
+    const ExecStatusType status = PQresultStatus(result);
+    return status == PGRES_FATAL_ERROR || status == PGRES_BAD_RESPONSE;
+}
+
+// When a connect that begins now is given up, by the parameter of that name; libpq takes no less than 2 seconds.
+Clock::time_point ConnectEnd(PGconn* connection) {
+    PQconninfoOption* const options = PQconninfo(connection);
+    int seconds = 0;
+    for (const PQconninfoOption* option = options; option && option->keyword; ++option) {
+        if (std::strcmp(option->keyword, "connect_timeout") == 0 && option->val) seconds = std::atoi(option->val);
+    }
+    PQconninfoFree(options);
+    return seconds > 0 ? Clock::now() + std::chrono::seconds(std::max(seconds, 2)) : kForever;
+}
+
+int Milliseconds(Clock::time_point end) {
+    if (end == kForever) return -1;
+    const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(end - Clock::now()).count();
+    return static_cast<int>(std::clamp<std::int64_t>(left + 1, 0, 1'000'000'000));
+}
+
+struct CancelDelete {
+    void operator()(PGcancel* cancel) const noexcept { PQfreeCancel(cancel); }
+};
+
+}  // namespace
+
+// ---- Connecting
+
+Status Wire::Connect(const Parameters& parameters, std::shared_ptr<const StopRequest> stop,
+                     std::unique_ptr<Wire>& wire) {
+    std::unique_ptr<Wire> made(new Wire);
+    made->stop_ = std::move(stop);
+    made->wake_ = eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK);
+    if (made->wake_ < 0) return Refused(errors::kInputOutputError, "no event to wait for");
+    Status status = made->Begin(parameters);
+    if (status.Ok()) wire = std::move(made);
+    return status;
+}
+
+Wire::~Wire() {
+    if (connection_) PQfinish(connection_);
+    if (wake_ >= 0) close(wake_);
+}
+
+Status Wire::Begin(const Parameters& parameters) noexcept try {
+    std::vector<const char*> names, values;
+    for (const auto& [name, value] : parameters.values) {
+        names.push_back(name.c_str());
+        values.push_back(value.c_str());
+    }
+    names.push_back(nullptr);
+    values.push_back(nullptr);
+    connection_ = PQconnectStartParams(names.data(), values.data(), 1);
+    if (!connection_) return Refused(errors::kOutOfMemory);
+    PQsetErrorVerbosity(connection_, PQERRORS_VERBOSE);    // the SQLSTATE stands in the message then
+    PQsetNoticeReceiver(connection_, OnNotice, this);
+    if (Status status = Poll(ConnectEnd(connection_)); !status.Ok()) return status;
+    return Settle();
+} catch (const std::bad_alloc&) {
+    return Refused(errors::kOutOfMemory);
+}
+
+Status Wire::Poll(Clock::time_point end) noexcept {
+    PostgresPollingStatusType wants = PGRES_POLLING_WRITING;
+    if (PQstatus(connection_) == CONNECTION_BAD) return ConnectFailure(PQerrorMessage(connection_));
+    while (wants != PGRES_POLLING_OK) {
+        const short events = wants == PGRES_POLLING_READING ? POLLIN : POLLOUT;
+        pollfd socket{PQsocket(connection_), events, 0};
+        const int ready = poll(&socket, 1, Milliseconds(end));
+        if (ready < 0 && errno == EINTR) continue;
+        if (ready == 0) return Refused(12170, "the server does not answer within connect_timeout");
+        wants = PQconnectPoll(connection_);
+        if (wants == PGRES_POLLING_FAILED) return ConnectFailure(PQerrorMessage(connection_));
+    }
+    return {};
+}
+
+Status Wire::Settle() noexcept {
+    if (PQsetnonblocking(connection_, 1) != 0 || !PQenterPipelineMode(connection_)) {
+        return Refused(errors::kOutOfMemory, PQerrorMessage(connection_));
+    }
+    return {};
+}
+
+void Wire::OnNotice(void* self, const PGresult* result) noexcept {
+    auto& wire = *static_cast<Wire*>(self);
+    if (!wire.notices) return;
+    const char* words = PQresultErrorField(result, PG_DIAG_MESSAGE_PRIMARY);
+    try {
+        wire.notices->push_back(Warning(kNoticeNumber, words ? words : "").From("POSTGRESQL"));
+    } catch (const std::bad_alloc&) {    // a notice changes nothing
+    }
+}
+
+// ---- Sending
+
+// A command that cannot be sent ends the batch: what would come behind it is left out.
+void Wire::Sent(int answer) noexcept {
+    if (answer == 1) open_ = true;
+    else if (PQstatus(connection_) == CONNECTION_BAD) broken_ = true;
+    else short_of_memory_ = true;
+}
+
+void Wire::Send(const char* sql) noexcept {
+    if (broken_ || short_of_memory_) return;
+    Sent(PQsendQueryParams(connection_, sql, 0, nullptr, nullptr, nullptr, nullptr, 0));
+}
+
+void Wire::SendQuery(const char* sql, const std::vector<const char*>& texts) noexcept {
+    if (broken_ || short_of_memory_) return;
+    Sent(PQsendQueryParams(connection_, sql, static_cast<int>(texts.size()), nullptr, texts.data(), nullptr, nullptr, 0));
+}
+
+void Wire::SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept {
+    if (broken_ || short_of_memory_) return;
+    Sent(PQsendPrepare(connection_, name, sql, static_cast<int>(types.size()), types.data()));
+}
+
+void Wire::SendDescribe(const char* name) noexcept {
+    if (broken_ || short_of_memory_) return;
+    Sent(PQsendDescribePrepared(connection_, name));
+}
+
+void Wire::SendExecute(const char* name, const Values& values, bool binary_results) noexcept {
+    if (broken_ || short_of_memory_) return;
+    Sent(PQsendQueryPrepared(connection_, name, static_cast<int>(values.data.size()), values.data.data(),
+                             values.lengths.data(), values.formats.data(), binary_results));
+}
+
+// Without its end a batch cannot be read: the connection is of no use then.
+void Wire::Sync() noexcept {
+    if (broken_) return;
+    if (PQpipelineSync(connection_) != 1) {
+        broken_ = true;
+        return;
+    }
+    open_ = false;
+    ++syncs_;
+}
+
+void Wire::Push() noexcept {
+    if (broken_ || PQflush(connection_) != 1) return;
+    PQconsumeInput(connection_);    // the server may wait for its answers to be taken
+}
+
+// ---- Receiving
+
+// Until something has come from the server, or there is nothing to wait for.
+bool Wire::Wait() noexcept {
+    const bool more = PQflush(connection_) == 1;
+    const bool stopping = heeds_ && Asked();
+    if (stopping && Clock::now() - cancelled_ > kBetweenCancels) Cancel();
+    pollfd places[] = {{PQsocket(connection_), static_cast<short>(more ? POLLIN | POLLOUT : POLLIN), 0},
+                       {wake_, static_cast<short>(heeds_ ? POLLIN : 0), 0}};
+    const auto end = stopping ? Clock::now() + kBetweenCancels : kForever;
+    if (poll(places, 2, Milliseconds(end)) < 0) return errno == EINTR;
+    if (places[1].revents & POLLIN) {
+        std::uint64_t count = 0;
+        if (read(wake_, &count, sizeof count) < 0) count = 0;    // somebody else's wake was as good
+    }
+    return places[0].revents == 0 || PQconsumeInput(connection_) == 1;
+}
+
+Result Wire::Next() noexcept {
+    if (broken_) return nullptr;
+    while (PQisBusy(connection_) && Wait()) continue;
+    Result result(PQgetResult(connection_));
+    if (result && PQresultStatus(result.get()) == PGRES_PIPELINE_SYNC) --syncs_;
+    if (PQstatus(connection_) == CONNECTION_BAD) broken_ = true;
+    return result;
+}
+
+Status Wire::Answer(const PGresult* result, Verb verb) noexcept {
+    const char* severity = PQresultErrorField(result, PG_DIAG_SEVERITY_NONLOCALIZED);
+    const bool fatal = severity && (std::strcmp(severity, "FATAL") == 0 || std::strcmp(severity, "PANIC") == 0);
+    broken_ = broken_ || fatal || PQstatus(connection_) == CONNECTION_BAD;
+    if (!broken_) return Failure(result, verb);
+    lost_told_ = true;
+    const char* words = PQresultErrorField(result, PG_DIAG_MESSAGE_PRIMARY);
+    return Refused(errors::kEndOfChannel, words ? words : "the connection to the server was lost");
+}
+
+Status Wire::Lost() noexcept {
+    if (std::exchange(lost_told_, true)) return Refused(errors::kNotConnected);
+    return Refused(errors::kEndOfChannel, "the connection to the server was lost");
+}
+
+Status Wire::Pass(int commands) noexcept {
+    Status first;
+    while (commands > 0 && !broken_) {
+        const Result result = Next();
+        if (!result) --commands;
+        else if (IsError(result.get()) && first.Ok()) first = Answer(result.get());
+    }
+    return broken_ && first.Ok() ? Lost() : first;
+}
+
+Status Wire::Drain(Result* last) noexcept {
+    Status first;
+    if (open_) Sync();
+    while (syncs_ > 0 && !broken_) {
+        Result result = Next();
+        if (!result) continue;
+        const ExecStatusType status = PQresultStatus(result.get());
+        if (IsError(result.get())) {
+            if (first.Ok()) first = Answer(result.get());
+        } else if (last && status != PGRES_PIPELINE_SYNC && status != PGRES_PIPELINE_ABORTED) {
+            *last = std::move(result);
+        }
+    }
+    if (std::exchange(short_of_memory_, false) && first.Ok()) first = Refused(errors::kOutOfMemory);
+    return broken_ && first.Ok() ? Lost() : first;
+}
+
+Status Wire::Run(const char* sql, Result* last) noexcept {
+    if (broken_) return Lost();
+    Send(sql);
+    Sync();
+    return Drain(last);
+}
+
+// ---- Stopping
+
+void Wire::Wake() noexcept {
+    const std::uint64_t one = 1;
+    if (write(wake_, &one, sizeof one) < 0) return;    // so many wakes wait that one more says nothing
+}
+
+// Asked for by the thread that waits, so that it can meet no other call.
+void Wire::Cancel() noexcept {
+    cancelled_ = Clock::now();
+    const std::unique_ptr<PGcancel, CancelDelete> cancel(PQgetCancel(connection_));
+    char words[256];
+    if (cancel) PQcancel(cancel.get(), words, sizeof words);
+}
+
+}  // namespace engine::postgres

@@ -1,0 +1,118 @@
+// One libpq connection, always in pipeline mode: commands are sent one behind the other, closed with Sync, and their
+// results read in the same order. It waits for the server, and has it cancel what runs when that is wished for.
+//
+// What was sent must be read to its end before the connection is used for something else: Drain does so, whatever is
+// left. One thread at a time, Wake aside.
+#pragma once
+
+#include <libpq-fe.h>
+
+#include <chrono>
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+#include <vector>
+
+#include "engine/engine.h"
+#include "engine/postgres/errors.h"
+
+namespace engine::postgres {
+
+struct ResultDelete {
+    void operator()(PGresult* result) const noexcept { PQclear(result); }
+};
+using Result = std::unique_ptr<PGresult, ResultDelete>;
+
+// libpq's names of connection parameters and their values; "dbname" may be a URL, which later ones override.
+struct Parameters {
+    std::vector<std::pair<std::string, std::string>> values;
+};
+
+class Wire {
+public:
+    static Status Connect(const Parameters& parameters, std::shared_ptr<const StopRequest> stop,
+                          std::unique_ptr<Wire>& wire);
+    ~Wire();
+    Wire(const Wire&) = delete;
+    Wire& operator=(const Wire&) = delete;
+
+    [[nodiscard]] PGconn* Libpq() const { return connection_; }
+    [[nodiscard]] bool Broken() const { return broken_; }
+    // What the server said last: whether a transaction is open, or has failed.
+    [[nodiscard]] PGTransactionStatusType Transaction() const { return PQtransactionStatus(connection_); }
+
+    // ---- Sending. A failure breaks off; what was sent before is read by Drain.
+    void Send(const char* sql) noexcept;
+    void SendQuery(const char* sql, const std::vector<const char*>& texts) noexcept;    // with texts as values
+    void SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept;
+    void SendDescribe(const char* name) noexcept;
+    struct Values {
+        std::vector<const char*> data;    // null: null
+        std::vector<int> lengths, formats;
+    };
+    void SendExecute(const char* name, const Values& values, bool binary_results) noexcept;
+    void Sync() noexcept;
+    void OneByOne() noexcept { PQsetSingleRowMode(connection_); }    // the rows of the command that is read next
+    void Flush() noexcept { if (!broken_) PQsendFlushRequest(connection_); }    // so that results so far come at once
+    // Waits for nothing: gives the server what it can take, and takes what has come.
+    void Push() noexcept;
+
+    // ---- Receiving
+    // The next result; null behind each command's last one. A broken connection answers null.
+    Result Next() noexcept;
+    // Results of so many commands are passed over; the first error of them.
+    Status Pass(int commands) noexcept;
+    // All that is left of what was sent; the first error of it. With `last`, the last result that is none.
+    Status Drain(Result* last = nullptr) noexcept;
+    [[nodiscard]] bool Idle() const { return syncs_ == 0 && !open_; }    // all that was sent is read
+    // Sent, closed and read: a command without values.
+    Status Run(const char* sql, Result* last = nullptr) noexcept;
+
+    // The status of an error's result, or of the connection that was lost with it.
+    Status Answer(const PGresult* result, Verb verb = Verb::other) noexcept;
+    Status Lost() noexcept;    // 3113 the first time, 3114 then
+
+    // ---- Stopping
+    void Obey(std::shared_ptr<const StopRequest> stop) noexcept { stop_ = std::move(stop); }
+    [[nodiscard]] bool Asked() const { return stop_ && stop_->Asked(); }
+    void Wake() noexcept;    // from any thread: look at the wish
+    // Has the server stop what runs; the error comes as its result.
+    void Cancel() noexcept;
+    // While one lives, waiting looks at the wish to stop.
+    class Heeding {
+    public:
+        explicit Heeding(Wire& wire, bool heeds = true) : wire_(wire), before_(wire.heeds_) { wire.heeds_ = heeds; }
+        ~Heeding() { wire_.heeds_ = before_; }
+        Heeding(const Heeding&) = delete;
+        Heeding& operator=(const Heeding&) = delete;
+
+    private:
+        Wire& wire_;
+        const bool before_;
+    };
+
+    std::vector<Status>* notices = nullptr;    // takes what the server says besides
+
+private:
+    Wire() = default;
+    Status Begin(const Parameters& parameters) noexcept;
+    Status Poll(std::chrono::steady_clock::time_point end) noexcept;
+    Status Settle() noexcept;
+    bool Wait() noexcept;
+    void Sent(int answer) noexcept;
+    static void OnNotice(void* self, const PGresult* result) noexcept;
+
+    PGconn* connection_ = nullptr;
+    int wake_ = -1;
+    std::shared_ptr<const StopRequest> stop_;
+    std::chrono::steady_clock::time_point cancelled_;
+    int syncs_ = 0;             // sent and not read yet
+    bool open_ = false;         // something was sent behind the last Sync
+    bool heeds_ = false;
+    bool broken_ = false;
+    bool lost_told_ = false;
+    bool short_of_memory_ = false;    // something could not be sent
+};
+
+}  // namespace engine::postgres
