@@ -234,6 +234,13 @@ public:
     virtual Status RollbackPrepared(const Xid& xid) = 0;
     virtual Status Recover(std::vector<Xid>& prepared) = 0;
 
+    // Of engines that cannot: makes sure of what a commit would check at its end, so that it then succeeds, and sets
+    // `changed` when there is anything to commit. A failure has rolled the transaction back, unless InTransaction holds.
+    virtual Status MakeReady(bool& changed) {
+        changed = InTransaction();
+        return {};
+    }
+
     // A further connection of the same user, who need not prove himself again. A branch that is set aside keeps its own
     // connection, with the transaction open, for whoever takes the branch up; its session goes on with another. 1022
     // where the database has room for one connection.
@@ -280,6 +287,9 @@ public:
     [[nodiscard]] virtual const Dialect& GetDialect() const = 0;
     [[nodiscard]] virtual const Capabilities& GetCapabilities() const = 0;
     virtual std::string Version() = 0;    // the text that OCIServerVersion answers; a release number first
+    // The same text for all that are the same database, so that branches of a global transaction are found by whoever
+    // is attached to it; empty for one that nobody else can be attached to.
+    [[nodiscard]] virtual std::string Identity() const { return {}; }
     // Begins a session: 1017 when the user is refused. `stop` is what the connection's calls look at while they run.
     virtual Status Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
                            std::unique_ptr<Connection>& connection) = 0;

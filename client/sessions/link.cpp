@@ -70,13 +70,45 @@ void Link::Answered(const Status& status) noexcept {
     if (status.Number() == errors::kCancelled) (void)stop_->Take();
 }
 
-void Link::Close() noexcept {
-    const SerialLock serial(serial_);    // calls on statements of the link may be running
+Status Link::CheckBranch(bool ends_transaction) {
+    if (!branch) return {};
+    return ends_transaction ? Error(errors::kEndsInBranch) : branch->Check(connection_->InTransaction());
+}
+
+Status Link::Commit() {
+    if (branch) return Error(errors::kEndsInBranch);
+    Status status = connection_->Commit();
+    local_started = local_started && connection_->InTransaction();
+    return status;
+}
+
+Status Link::Rollback() {
+    if (branch) return Error(errors::kEndsInBranch);
+    local_started = false;
+    return connection_->Rollback();
+}
+
+void Link::DropUsers(void (LinkUser::*told)() noexcept) noexcept {
     while (LinkUser* user = AnyUser()) {
-        user->LinkClosed();
+        (user->*told)();
         user->Use(nullptr);
     }
     statement_cache.reset();
+}
+
+std::unique_ptr<engine::Connection> Link::Exchange(std::unique_ptr<engine::Connection> next) noexcept {
+    DropUsers(&LinkUser::ConnectionChanged);
+    next->Obey(stop_);
+    const std::lock_guard lock(cancel_mutex_);
+    connection_.swap(next);
+    return next;
+}
+
+void Link::Close() noexcept {
+    const SerialLock serial(serial_);    // calls on statements of the link may be running
+    DropUsers(&LinkUser::LinkClosed);
+    branch.reset();
+    spare.reset();
     std::unique_ptr<engine::Connection> ended;    // rolls back when it goes, after the lock
     const std::lock_guard lock(cancel_mutex_);
     ended = std::move(connection_);

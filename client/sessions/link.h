@@ -31,6 +31,8 @@ class LinkUser {
 public:
     // Drop what was made from the connection; the link is left afterwards. May not throw.
     virtual void LinkClosed() noexcept = 0;
+    // The same when the session goes on with another connection.
+    virtual void ConnectionChanged() noexcept { LinkClosed(); }
 
 protected:
     LinkUser() = default;
@@ -55,6 +57,13 @@ struct LinkData {
     virtual ~LinkData() = default;
 };
 
+// The branch of a global transaction that a session works in. While it is there, only calls on the branch end the
+// transaction: whatever else would is refused (2089). When the session goes, so does the branch.
+struct LinkBranch : LinkData {
+    // Before a statement runs: 24761 when the branch's work is lost.
+    virtual Status Check(bool in_transaction) = 0;
+};
+
 class Link {
 public:
     // `threaded`: calls on the link are serialised. The connection heeds `stop`.
@@ -76,10 +85,26 @@ public:
     // To be told what an execute or a fetch answered: one that was stopped (1013) has met the wish, which is forgotten.
     void Answered(const Status& status) noexcept;
 
+    // Ends the session's own transaction: 2089 within a branch.
+    Status Commit();
+    Status Rollback();
+    // Whether a statement may run that ends transactions, or one that does not.
+    Status CheckBranch(bool ends_transaction);
+    [[nodiscard]] bool InLocalTransaction() const {
+        return !branch && connection_ && (local_started || connection_->InTransaction());
+    }
+
+    // Goes on with another connection of the same user; what was made from the one before is dropped, and it is
+    // answered as it is, perhaps in a transaction.
+    std::unique_ptr<engine::Connection> Exchange(std::unique_ptr<engine::Connection> next) noexcept;
+
     // Drops what depends on the connection, and the connection: what is open is rolled back.
     void Close() noexcept;
 
     std::unique_ptr<LinkData> statement_cache;
+    std::unique_ptr<LinkBranch> branch;                  // null: the session's work is its own
+    std::unique_ptr<engine::Connection> spare;           // for the next branch that is set aside; in no transaction
+    bool local_started = false;                          // an application has begun a transaction of its own
     std::string user;                    // who is logged on; empty: the operating-system user
     std::uint32_t open_statements = 0;    // OCI_ATTR_NUM_OPEN_STMTS
 
@@ -88,6 +113,7 @@ private:
     void Add(LinkUser& user) noexcept;
     void Remove(LinkUser& user) noexcept;
     LinkUser* AnyUser() noexcept;
+    void DropUsers(void (LinkUser::*told)() noexcept) noexcept;
 
     const std::shared_ptr<engine::Database> database_;
     const std::shared_ptr<engine::StopRequest> stop_;

@@ -92,7 +92,7 @@ Status Session::Connect(Server& server, const engine::Credentials& credentials) 
 Status Session::End() {
     const Turn turn(*this);
     if (!turn.link) return Error(errors::kNotLoggedOn);
-    Status status = turn.link->Engine().Commit();
+    Status status = turn.link->Commit();
     if (!status.Failed()) Drop();
     return status;
 }

@@ -114,8 +114,8 @@ Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
     switch (step.run) {
         case sql::Run::nothing: return {};
         case sql::Run::begin: return Engine().Begin(engine::TransactionMode::read_write);
-        case sql::Run::commit: return Engine().Commit();
-        case sql::Run::rollback: return Engine().Rollback();
+        case sql::Run::commit: return UsedLink()->Commit();
+        case sql::Run::rollback: return UsedLink()->Rollback();
         default: break;
     }
     for (const std::uint32_t target : step.targets)

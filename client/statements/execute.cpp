@@ -46,6 +46,10 @@ bool IsForEngine(const sql::Step& step) {
            step.run != sql::Run::nothing;
 }
 
+bool EndsTransaction(const sql::Step& step) {
+    return step.run == sql::Run::commit || step.run == sql::Run::rollback || step.run == sql::Run::definition;
+}
+
 }  // namespace
 
 Status Statement::Execute(const ExecuteTarget& target, ErrorHandle& error, const ExecuteArguments& arguments) {
@@ -78,6 +82,8 @@ Status Statement::Ready(const ExecuteTarget& target, const ExecuteArguments& arg
     if (!text_.IsSet()) return Error(errors::kNotPrepared);
     if (Status status = CheckMode(arguments.mode); !status.Ok()) return status;
     if (!target.link) return target.status;
+    const bool ends = arguments.mode & OCI_COMMIT_ON_SUCCESS || std::ranges::any_of(Scanned().steps, EndsTransaction);
+    if (Status status = target.link->CheckBranch(ends); !status.Ok()) return status;
     if (target.link != UsedLink()) {
         Drop();
         Use(target.link);
@@ -160,7 +166,7 @@ Status Statement::Complete(Status status, const ExecuteArguments& arguments) {
     run_.fetch_error = 0;
     if (run_.state == Execution::State::initialized) run_.state = Execution::State::executed;
     if (!(arguments.mode & OCI_COMMIT_ON_SUCCESS) || pieces_.Wants() != PieceStream::Use::none) return status;
-    Status committed = Engine().Commit();
+    Status committed = UsedLink()->Commit();
     return committed.Ok() ? status : committed;
 }
 
@@ -306,7 +312,7 @@ Status Statement::RunControl(const ExecuteArguments& arguments) {
     if (Status status = CheckOnce(arguments); !status.Ok()) return status;
     switch (Scanned().steps[0].run) {
         case sql::Run::begin: return Engine().Begin(engine::TransactionMode::read_write);
-        case sql::Run::commit: return Engine().Commit();
-        default: return Engine().Rollback();
+        case sql::Run::commit: return UsedLink()->Commit();
+        default: return UsedLink()->Rollback();
     }
 }

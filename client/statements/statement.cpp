@@ -38,6 +38,12 @@ void Statement::LinkClosed() noexcept {
     run_.fetch_error = errors::kNotConnected;
 }
 
+// An open result is gone with the connection; what was executed counts as before.
+void Statement::ConnectionChanged() noexcept {
+    if (run_.cursor.IsOpen()) run_.fetch_error = errors::kFetchOutOfSequence;
+    Drop();
+}
+
 void Statement::Drop() noexcept {
     CloseCursor();
     pieces_.End();

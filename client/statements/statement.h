@@ -43,6 +43,7 @@ public:
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
     [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
     void LinkClosed() noexcept override;
+    void ConnectionChanged() noexcept override;
 
     // What every call on the statement's handle asks first: 3127 while a callback of it runs.
     [[nodiscard]] Status Admit() const { return pieces_.Asks() ? Error(errors::kOperationActive) : Status(); }

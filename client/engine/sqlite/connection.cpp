@@ -240,6 +240,7 @@ Status SqliteConnection::Begin(TransactionMode mode) {
     }
     (void)ReadAhead(nullptr);
     read_only_ = mode == TransactionMode::read_only;
+    changes_before_ = sqlite3_total_changes64(Database());
     if (mode == TransactionMode::read_write) return Run(Own::begin);
     Status status = Run(Own::begin_reading);
     return status.Ok() ? LookOrEnd() : status;
@@ -298,6 +299,16 @@ Status SqliteConnection::Prepare(const Xid&, bool&) { return Unsupported("two-ph
 Status SqliteConnection::CommitPrepared(const Xid&) { return Unsupported("two-phase commit"); }
 Status SqliteConnection::RollbackPrepared(const Xid&) { return Unsupported("two-phase commit"); }
 Status SqliteConnection::Recover(std::vector<Xid>&) { return Unsupported("two-phase commit"); }
+
+// Only a foreign key is checked at the end.
+Status SqliteConnection::MakeReady(bool& changed) {
+    changed = InTransaction() && sqlite3_total_changes64(Database()) != changes_before_;
+    int unresolved = 0, highest = 0;
+    sqlite3_db_status(Database(), SQLITE_DBSTATUS_DEFERRED_FKS, &unresolved, &highest, 0);
+    if (unresolved == 0) return {};
+    Status undone = Rollback();
+    return undone.Failed() ? undone : Error(errors::kRolledBack, "FOREIGN KEY constraint failed").From("SQLITE");
+}
 
 // Outside a transaction an older query's rows would keep a new one from seeing what others have committed since.
 Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, bool& began) {

@@ -59,6 +59,7 @@ public:
     Status CommitPrepared(const Xid& xid) override;
     Status RollbackPrepared(const Xid& xid) override;
     Status Recover(std::vector<Xid>& prepared) override;
+    Status MakeReady(bool& changed) override;
     Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { stop_ = std::move(stop); }
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
@@ -148,6 +149,7 @@ private:
     bool heeds_ = true;                // the call that runs looks at stop_
     bool trusted_ = false;
     bool read_only_ = false;           // the transaction, if there is one
+    sqlite3_int64 changes_before_ = 0; // it began
     bool broken_ = false;
     bool utf8_ = true;
     std::string* table_ = nullptr;     // takes the table that the statement which is compiled changes

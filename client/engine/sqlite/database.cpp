@@ -47,6 +47,7 @@ public:
         return kNone;
     }
     std::string Version() override;
+    [[nodiscard]] std::string Identity() const override { return home_->Private() ? "" : home_->File(); }
     Status Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
                    std::unique_ptr<Connection>& connection) override;
 
