@@ -58,7 +58,7 @@ TEST(NumberToText, EveryElement) {
          "12345678901234567890123456789012345678910"},
         {"-.9876543210987654321098765432109876543211", "9V99999999999999999999999999999999999999999",
          " -98765432109876543210987654321098765432110"},
-        {"0.96", "9V9", " 10"}, {"9.94E125", "9.9EEEE", " 9.9E+125"}, {"-9.96E-101", "9.9EEEE", "-1.0E-100"},
+        {"0.96", "9V9", " 10"}, {"0", "9V99", "   0"}, {"0", "FM9V99", "0"}, {"9.94E125", "9.9EEEE", " 9.9E+125"}, {"-9.96E-101", "9.9EEEE", "-1.0E-100"},
         {"-9.96E-100", "9.9EEEE", "-1.0E-99"}, {"1E-130", "99EEEE", " 1E-130"},
         // A negative value stays one when its digits become 0.
         {"-0.001", "9.99", " -.00"}, {"-0.001", "9.99S", " .00-"}, {"-0.001", "9.99PR", " <.00>"},
@@ -121,6 +121,7 @@ TEST(NumberFromText, EveryElement) {
     for (const auto& c : cases) EXPECT_EQ(Parsed(c.text, c.model), c.number) << c.text << " by " << c.model;
     EXPECT_EQ(Parsed("1.234,5", "9G999D9", kGerman), "1234.5");
     EXPECT_EQ(Parsed("\xE2\x82\xAC" "12", "L99", kGerman), "12");
+    EXPECT_EQ(Parsed("0." + std::string(2000, '0') + "12e2001", ""), "1.2");
     EXPECT_EQ(Parsed("12EUR", "99C", kGerman), "12");
     EXPECT_EQ(Parsed("12DM", "99U", kGerman), "12");
 }
