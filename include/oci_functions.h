@@ -80,6 +80,7 @@ sword OCIStmtFetch2(OCIStmt *stmt, OCIError *err, ub4 rows, ub2 orientation, sb4
 sword OCIResultSetToStmt(OCIResult *rset, OCIError *err);
 sword OCIStmtGetBindInfo(OCIStmt *stmt, OCIError *err, ub4 size, ub4 startloc, sb4 *found, OraText *names[],
                          ub1 nameLens[], OraText *indNames[], ub1 indLens[], ub1 dups[], OCIBind *binds[]);
+sword OCIStmtGetNextResult(OCIStmt *stmt, OCIError *err, dvoid **result, ub4 *rtype, ub4 mode);
 sword OCIStmtGetPieceInfo(OCIStmt *stmt, OCIError *err, dvoid **hndl, ub4 *type, ub1 *inOut, ub4 *iter, ub4 *idx,
                           ub1 *piece);
 sword OCIStmtSetPieceInfo(dvoid *hndl, ub4 type, OCIError *err, CONST dvoid *buf, ub4 *len, ub1 piece,
@@ -94,6 +95,14 @@ sword OCIBindByPos(OCIStmt *stmt, OCIBind **bind, OCIError *err, ub4 pos, dvoid 
                    dvoid *ind, ub2 *alen, ub2 *rcode, ub4 maxArrayLen, ub4 *curElements, ub4 mode);
 sword OCIDefineByPos(OCIStmt *stmt, OCIDefine **def, OCIError *err, ub4 pos, dvoid *value, sb4 valueSize, ub2 type,
                      dvoid *ind, ub2 *rlen, ub2 *rcode, ub4 mode);
+/* The same with wide sizes and lengths. */
+sword OCIBindByName2(OCIStmt *stmt, OCIBind **bind, OCIError *err, CONST OraText *name, sb4 nameLen, dvoid *value,
+                     sb8 valueSize, ub2 type, dvoid *ind, ub4 *alen, ub2 *rcode, ub4 maxArrayLen, ub4 *curElements,
+                     ub4 mode);
+sword OCIBindByPos2(OCIStmt *stmt, OCIBind **bind, OCIError *err, ub4 pos, dvoid *value, sb8 valueSize, ub2 type,
+                    dvoid *ind, ub4 *alen, ub2 *rcode, ub4 maxArrayLen, ub4 *curElements, ub4 mode);
+sword OCIDefineByPos2(OCIStmt *stmt, OCIDefine **def, OCIError *err, ub4 pos, dvoid *value, sb8 valueSize, ub2 type,
+                      dvoid *ind, ub4 *rlen, ub2 *rcode, ub4 mode);
 sword OCIBindArrayOfStruct(OCIBind *b, OCIError *err, ub4 valueSkip, ub4 indSkip, ub4 lenSkip, ub4 rcodeSkip);
 sword OCIDefineArrayOfStruct(OCIDefine *d, OCIError *err, ub4 valueSkip, ub4 indSkip, ub4 lenSkip, ub4 rcodeSkip);
 sword OCIBindDynamic(OCIBind *b, OCIError *err, dvoid *inCtx, OCICallbackInBind in, dvoid *outCtx,

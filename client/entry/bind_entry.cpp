@@ -6,13 +6,30 @@
 
 namespace {
 
-Status BindByName(Statement& statement, OCIBind** bind, const OraText* name, sb4 length,
-                  const Statement::BindArguments& arguments) {
-    if (!name) return Error(errors::kNoSuchBind);
-    // A length below 0 asks to measure the name.
-    const std::size_t measured = length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length);
-    const CallText text(statement.Env(), name, measured, false);
-    return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(errors::kBadText);
+// The forms of a call differ in the width of sizes and lengths alone.
+sword BindByName(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 length,
+                 const Statement::BindArguments& arguments) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        if (!name) return Error(errors::kNoSuchBind);
+        // A length below 0 asks to measure the name.
+        const std::size_t measured = length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length);
+        const CallText text(statement.Env(), name, measured, false);
+        return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(errors::kBadText);
+    });
+}
+
+sword BindByPosition(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 position,
+                     const Statement::BindArguments& arguments) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return statement.BindByPosition(bind, position, arguments);
+    });
+}
+
+sword DefineByPosition(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 position, const AreaArguments& arguments,
+                       ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement& statement) {
+        return statement.DefineByPosition(def, position, arguments, mode);
+    });
 }
 
 // Steps of an array of structures, for a bind or a define.
@@ -29,25 +46,37 @@ sword SetSteps(const void* object, OCIError* err, ub4 value, ub4 indicator, ub4 
 sword OCIBindByName(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 nameLen, dvoid* value,
                     sb4 valueSize, ub2 type, dvoid* ind, ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements,
                     ub4 mode) {
-    return Enter<Statement>(stmt, err, [&](Statement& statement) {
-        return BindByName(statement, bind, name, nameLen,
-                          {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
-    });
+    return BindByName(stmt, bind, err, name, nameLen,
+                      {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
 }
 
 sword OCIBindByPos(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type,
                    dvoid* ind, ub2* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
-    return Enter<Statement>(stmt, err, [&](Statement& statement) {
-        return statement.BindByPosition(
-            bind, pos, {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
-    });
+    return BindByPosition(stmt, bind, err, pos,
+                          {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
 }
 
 sword OCIDefineByPos(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 pos, dvoid* value, sb4 valueSize, ub2 type,
                      dvoid* ind, ub2* rlen, ub2* rcode, ub4 mode) {
-    return Enter<Statement>(stmt, err, [&](Statement& statement) {
-        return statement.DefineByPosition(def, pos, {value, valueSize, type, ind, rlen, rcode}, mode);
-    });
+    return DefineByPosition(stmt, def, err, pos, {value, valueSize, type, ind, rlen, rcode}, mode);
+}
+
+sword OCIBindByName2(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 nameLen, dvoid* value,
+                    sb8 valueSize, ub2 type, dvoid* ind, ub4* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements,
+                    ub4 mode) {
+    return BindByName(stmt, bind, err, name, nameLen,
+                      {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
+}
+
+sword OCIBindByPos2(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 pos, dvoid* value, sb8 valueSize, ub2 type,
+                   dvoid* ind, ub4* alen, ub2* rcode, ub4 maxArrayLen, ub4* curElements, ub4 mode) {
+    return BindByPosition(stmt, bind, err, pos,
+                          {{value, valueSize, type, ind, alen, rcode}, maxArrayLen, curElements, mode});
+}
+
+sword OCIDefineByPos2(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 pos, dvoid* value, sb8 valueSize, ub2 type,
+                     dvoid* ind, ub4* rlen, ub2* rcode, ub4 mode) {
+    return DefineByPosition(stmt, def, err, pos, {value, valueSize, type, ind, rlen, rcode}, mode);
 }
 
 sword OCIBindDynamic(OCIBind* b, OCIError* err, dvoid* inCtx, OCICallbackInBind in, dvoid* outCtx,

@@ -135,6 +135,17 @@ sword OCIStmtGetBindInfo(OCIStmt* stmt, OCIError* err, ub4 size, ub4 startloc, s
     });
 }
 
+// No statement gives results beside its own rows and the cursors that it is handed.
+sword OCIStmtGetNextResult(OCIStmt* stmt, OCIError* err, dvoid** result, ub4* rtype, ub4 mode) {
+    return Enter<Statement>(stmt, err, [&](Statement&) {
+        if (!result || !rtype) return Error(errors::kNullArgument);
+        if (mode != OCI_DEFAULT) return Error(errors::kBadMode);
+        *result = nullptr;
+        *rtype = 0;
+        return NoData();
+    });
+}
+
 sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type, ub1* inOut, ub4* iter, ub4* idx,
                           ub1* piece) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {

@@ -1,6 +1,7 @@
 // Bind and define handles: taking over the application's areas, and the attributes of both.
 #include "statements/data_area.h"
 
+#include <algorithm>
 #include <utility>
 
 #include "handles/environment.h"
@@ -97,7 +98,9 @@ Status DataArea::Assign(const AreaArguments& arguments, bool in_pieces) {
     const values::ExternalType* type = nullptr;
     std::uint32_t size = 0;
     const bool may_be_null = handle_type_ == OCI_HTYPE_BIND;
-    const int error = values::FindType(arguments.type, arguments.size, may_be_null, type, size);
+    constexpr sb8 kMost = 0xFFFFFFFF;    // of a value in pieces any limit will do
+    const sb8 area = in_pieces ? std::min(arguments.size, kMost) : arguments.size;
+    const int error = values::FindType(arguments.type, area, may_be_null, type, size);
     if (type && in_pieces && !type->in_pieces) return Error(errors::kIllegalForPieces);
     if (error != 0) return Error(error);
     type_ = type;
@@ -109,7 +112,9 @@ Status DataArea::Assign(const AreaArguments& arguments, bool in_pieces) {
     elements.size = size;
     elements.value_step = size;
     elements.indicators = static_cast<char*>(arguments.indicators);
-    elements.lengths = reinterpret_cast<char*>(arguments.lengths);
+    elements.lengths = arguments.lengths.array;
+    elements.wide_lengths = arguments.lengths.wide;
+    if (arguments.lengths.wide) elements.length_step = sizeof(ub4);
     elements.codes = reinterpret_cast<char*>(arguments.codes);
     return {};
 }

@@ -18,13 +18,21 @@
 #include "statements/share.h"
 #include "values/conversion.h"
 
+// An array of lengths: of 16 bits, or of 32 as the wide forms of the calls take it.
+struct LengthArray {
+    LengthArray(ub2* array) : array(reinterpret_cast<char*>(array)), wide(false) {}    // NOLINT(google-explicit-constructor)
+    LengthArray(ub4* array) : array(reinterpret_cast<char*>(array)), wide(true) {}     // NOLINT(google-explicit-constructor)
+    char* array;
+    bool wide;
+};
+
 // The arguments that the bind and define calls share.
 struct AreaArguments {
     dvoid* value;
-    sb4 size;
+    sb8 size;
     ub2 type;
     dvoid* indicators;
-    ub2* lengths;
+    LengthArray lengths;
     ub2* codes;
 };
 

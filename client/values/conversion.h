@@ -49,7 +49,7 @@ struct Source {
     const char* at;
     std::uint32_t size;
     bool has_length;
-    std::uint16_t length;
+    std::uint32_t length;
 };
 
 using OutConverter = int (*)(const engine::Datum& datum, Workspace& workspace, Target& target);
@@ -145,7 +145,7 @@ inline int Load(const Elements& elements, std::size_t index, InConverter in, Wor
     const char* at = elements.Value(index);
     if (!at || elements.IsNull(index)) return 0;
     const bool has_length = elements.lengths != nullptr;
-    return in({at, elements.size, has_length, has_length ? elements.Length(index) : std::uint16_t{0}}, workspace,
+    return in({at, elements.size, has_length, has_length ? elements.Length(index) : 0}, workspace,
               datum);
 }
 

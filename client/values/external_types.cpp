@@ -83,6 +83,7 @@ int CheckSize(const ExternalType& type, std::int64_t size, std::uint32_t& area) 
     const bool power_of_two = (size & (size - 1)) == 0;
     if (type.family == Family::integer && (size > 8 || !power_of_two)) return errors::kBadFixedLength;
     if (type.family == Family::real && (size > 16 || !power_of_two)) return errors::kBadFixedLength;
+    if (size > std::numeric_limits<std::uint32_t>::max()) return errors::kBadAreaLength;
     area = static_cast<std::uint32_t>(size);
     return 0;
 }

@@ -324,4 +324,42 @@ TEST_F(Binds, HostileAreas) {
     }
 }
 
+// Lengths of more than 16 bits, in arrays with steps of their own; sizes of more than 32.
+TEST_F(Binds, WideForms) {
+    MustRun("create table t(a varchar2(80000))");
+    std::string in(140000, 'x'), out(160000, '#');
+    ub4 lengths[2] = {70000, 65536}, stored[3] = {9, 9, 9};
+    OCIBind* bind = nullptr;
+    OCIDefine* define = nullptr;
+    for (const bool by_name : {true, false}) {
+        ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
+        const auto bound = [&](sb8 size) {
+            return Answer(by_name ? OCIBindByName2(stmt, &bind, err, Bytes(":1"), 2, in.data(), size, SQLT_CHR, nullptr,
+                                                   lengths, nullptr, 0, nullptr, OCI_DEFAULT)
+                                  : OCIBindByPos2(stmt, &bind, err, 1, in.data(), size, SQLT_CHR, nullptr, lengths,
+                                                  nullptr, 0, nullptr, OCI_DEFAULT));
+        };
+        EXPECT_EQ(bound(sb8{1} << 32), 1459);
+        EXPECT_EQ(bound(-1), 1459);
+        ASSERT_EQ(bound(70000), 0);
+        EXPECT_EQ(Execute(2), 0);
+    }
+    EXPECT_EQ(One("select group_concat(length(a), ',') from t"), "70000,65536,70000,65536");
+    ASSERT_EQ(Prepare("select a from t"), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos2(stmt, &define, err, 1, out.data(), 80000, SQLT_STR, nullptr, stored, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Execute(2), 0);
+    EXPECT_EQ(stored[0], 70000u);
+    EXPECT_EQ(stored[1], 65536u);
+    EXPECT_EQ(stored[2], 9u);
+    EXPECT_EQ(Answer(OCIDefineByPos2(stmt, &define, err, 1, nullptr, sb8{1} << 40, SQLT_LNG, nullptr, stored, nullptr,
+                                     OCI_DYNAMIC_FETCH)), 0) << "of pieces";
+    dvoid* result = &in;
+    ub4 type = 9;
+    EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, &type, OCI_DEFAULT)), 1403);
+    EXPECT_EQ(result, nullptr);
+    EXPECT_EQ(OCIStmtGetNextResult(stmt, err, &result, &type, OCI_DEFAULT), OCI_NO_DATA);
+    EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, &type, 1)), 24300);
+    EXPECT_EQ(OCIStmtGetNextResult(nullptr, err, &result, &type, OCI_DEFAULT), OCI_INVALID_HANDLE);
+}
+
 }  // namespace
