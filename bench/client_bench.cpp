@@ -1,5 +1,5 @@
 // What a user of the client library would notice, each beside the same work on the engine's own interface in the same
-// run: rows inserted by array binds, rows fetched into array defines. Prints the median of the paired ratios.
+// run: rows inserted by array binds, rows fetched into array defines and in pieces. Prints the median of the paired ratios.
 //   client_bench [runs]
 #include <sqlite3.h>
 
@@ -230,6 +230,87 @@ ub8 FetchBare(const Bare& bare) {
     return rows;
 }
 
+// ---- In pieces: two texts a row, each into a buffer that takes it in one
+
+const char* const kTexts = "select name, note from t";
+constexpr ub4 kRoom = 1000;
+
+// The place of the next piece, and what came into the last one.
+struct Piece {
+    char buffer[kRoom];
+    ub4 length = 0;
+    sb2 indicator = 0;
+    ub2 code = 0;
+    ub8 bytes = 0;
+
+    static sb4 Place(dvoid* context, OCIDefine*, ub4, dvoid** buffer, ub4** length, ub1*, dvoid** indicator, ub2** code) {
+        auto& self = *static_cast<Piece*>(context);
+        self.bytes += self.length;
+        self.length = kRoom;
+        *buffer = self.buffer, *length = &self.length, *indicator = &self.indicator, *code = &self.code;
+        return OCI_CONTINUE;
+    }
+};
+
+void StartPieces(const Session& session, Piece& piece, bool by_callback) {
+    session.Prepare(kTexts);
+    for (const ub4 position : {1, 2}) {
+        OCIDefine* define = nullptr;
+        session.Check(OCIDefineByPos(session.stmt, &define, session.err, position, nullptr, 1, SQLT_CHR, nullptr,
+                                     nullptr, nullptr, OCI_DYNAMIC_FETCH));
+        if (by_callback) session.Check(OCIDefineDynamic(define, session.err, &piece, Piece::Place));
+    }
+    session.Check(OCIStmtExecute(session.svc, session.stmt, session.err, 0, 0, nullptr, nullptr, OCI_DEFAULT));
+}
+
+ub8 PiecesByCallback(const Session& session) {
+    Piece piece;
+    StartPieces(session, piece, true);
+    for (sword rc = OCI_SUCCESS; rc == OCI_SUCCESS;) {
+        rc = OCIStmtFetch2(session.stmt, session.err, kBatch, OCI_FETCH_NEXT, 0, OCI_DEFAULT);
+        session.Check(rc);
+    }
+    return piece.bytes + piece.length;
+}
+
+ub8 PiecesByPolling(const Session& session) {
+    Piece piece;
+    StartPieces(session, piece, false);
+    for (sword rc = OCI_SUCCESS; rc != OCI_NO_DATA;) {
+        rc = OCIStmtFetch2(session.stmt, session.err, 1, OCI_FETCH_NEXT, 0, OCI_DEFAULT);
+        piece.bytes += piece.length;
+        piece.length = 0;
+        if (rc != OCI_NEED_DATA) {
+            session.Check(rc);
+            continue;
+        }
+        dvoid* handle = nullptr;
+        ub4 type = 0, iteration = 0, index = 0;
+        ub1 direction = 0, wanted = 0;
+        session.Check(OCIStmtGetPieceInfo(session.stmt, session.err, &handle, &type, &direction, &iteration, &index, &wanted));
+        piece.length = kRoom;
+        session.Check(OCIStmtSetPieceInfo(handle, type, session.err, piece.buffer, &piece.length, wanted,
+                                          &piece.indicator, &piece.code));
+    }
+    return piece.bytes;
+}
+
+ub8 PiecesBare(const Bare& bare) {
+    sqlite3_stmt* query = bare.Prepare(kTexts);
+    char buffer[kRoom];
+    ub8 bytes = 0;
+    while (sqlite3_step(query) == SQLITE_ROW) {
+        for (int column = 0; column < 2; ++column) {
+            const unsigned char* text = sqlite3_column_text(query, column);
+            const int length = sqlite3_column_bytes(query, column);
+            if (text) std::memcpy(buffer, text, static_cast<size_t>(length));
+            bytes += static_cast<ub8>(length);
+        }
+    }
+    sqlite3_finalize(query);
+    return bytes;
+}
+
 void Run(const std::string& folder, int runs) {
     const std::string ours = folder + "/ours.db";
     const std::string theirs = folder + "/theirs.db";
@@ -240,6 +321,12 @@ void Run(const std::string& folder, int runs) {
     const auto all = [](ub8 rows) { if (rows != kRows) Fail("not every row came back"); };
     Pair("array define of 200,000 rows by 1,000 / bare loop", 2.0, runs,
          [&] { all(FetchThroughLibrary(session)); }, [&] { all(FetchBare(bare)); });
+    const ub8 bytes = PiecesBare(bare);
+    const auto whole = [bytes](ub8 fetched) { if (fetched != bytes) Fail("not every byte came back"); };
+    Pair("pieces of 200,000 rows by callback / bare loop", 3.0, runs,
+         [&] { whole(PiecesByCallback(session)); }, [&] { whole(PiecesBare(bare)); });
+    Pair("pieces of 200,000 rows by polling / bare loop", 3.0, runs,
+         [&] { whole(PiecesByPolling(session)); }, [&] { whole(PiecesBare(bare)); });
 }
 
 }  // namespace
