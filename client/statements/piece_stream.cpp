@@ -282,6 +282,11 @@ bool PieceStream::NextReturned() {
     return false;
 }
 
+bool PieceStream::ReturnsToCallbacks() const noexcept {
+    return !outs_.empty() &&
+           std::all_of(outs_.begin(), outs_.end(), [](const auto& bind) { return bind->AsksBy().out != nullptr; });
+}
+
 Status PieceStream::Deliver(PieceDriver& driver) {
     while (wanted_.area || NextReturned())
         if (Status status = HandPieces(driver); !status.Ok()) return status;

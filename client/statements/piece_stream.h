@@ -64,6 +64,7 @@ public:
     // What the iteration gave the targets, or, of a block, what its variables hold.
     void StartDelivery(bool is_block);
     void ForgetReturned() noexcept;    // the iteration failed
+    [[nodiscard]] bool ReturnsToCallbacks() const noexcept;    // all that comes back
     [[nodiscard]] bool Delivers() const { return wanted_.out; }
     Status Deliver(PieceDriver& driver);
     void NextIteration() noexcept;

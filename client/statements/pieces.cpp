@@ -1,6 +1,8 @@
 // Statements: executes and fetches whose values go in pieces. They end with OCI_NEED_DATA where the driver waits for the
 // application, and go on with the next call of the same function.
 #include <exception>
+#include <memory>
+#include <utility>
 
 #include "handles/errors.h"
 #include "statements/fetch_sink.h"
@@ -81,6 +83,44 @@ private:
     const int before_ = std::uncaught_exceptions();
 };
 
+// What one iteration can be undone to. The session may go while callbacks run, and the transaction end: the mark goes
+// with them, and what follows is none of its business.
+class IterationMark {
+public:
+    explicit IterationMark(std::shared_ptr<Link> link) : link_(std::move(link)) {}
+    ~IterationMark() {
+        bool is_undone = false;
+        if (is_set_) (void)Undo(is_undone);
+    }
+    IterationMark(const IterationMark&) = delete;
+    IterationMark& operator=(const IterationMark&) = delete;
+
+    Status Set() {
+        began_ = !link_->Engine().InTransaction();
+        Status status = link_->Engine().SetMark();
+        is_set_ = status.Ok();
+        return status;
+    }
+    Status Keep() {
+        Status status = TakeStanding() ? link_->Engine().DropMark() : Status();
+        return status.Number() == errors::kNoSuchSavepoint ? Status() : status;
+    }
+    Status Undo(bool& is_undone) {
+        if (!TakeStanding()) return {};
+        Status status = link_->Engine().UndoToMark();
+        is_undone = status.Number() != errors::kNoSuchSavepoint;
+        if (!status.Ok()) return status;
+        return began_ ? link_->Engine().Rollback() : link_->Engine().DropMark();
+    }
+
+private:
+    bool TakeStanding() { return std::exchange(is_set_, false) && !link_->Closed() && link_->Engine().InTransaction(); }
+
+    const std::shared_ptr<Link> link_;
+    bool began_ = false;
+    bool is_set_ = false;
+};
+
 }  // namespace
 
 Status Statement::StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments) {
@@ -106,8 +146,12 @@ Status Statement::ContinueExecute(ErrorHandle& error) {
                 pieces_.End();
                 return Run(error, arguments);
             }
-            if (status = RunCollected(stopped); stopped) break;
-            pieces_.StartDelivery(Scanned().is_block);
+            if (pieces_.ReturnsToCallbacks()) {
+                if (status = RunAndDeliver(stopped); !status.Ok() && !stopped) return status;
+            } else {
+                status = RunCollected(stopped);
+            }
+            if (stopped) break;
         }
         if (status = pieces_.Deliver(driver_); !status.Ok()) return status;
         if (pieces_.Wanted().iteration + 1 >= arguments.iterations) break;
@@ -130,5 +174,28 @@ Status Statement::RunCollected(bool& stopped) {
     if (!is_block) run_.row_count = outcome_.affected;
     if (!is_block && outcome_.executed == done_before) pieces_.ForgetReturned();
     stopped = status.Failed() || (!outcome_.failures.empty() && !(mode & OCI_BATCH_ERRORS));
+    if (!stopped) pieces_.StartDelivery(is_block);
     return status;
+}
+
+// The same where callbacks take all that comes back: an iteration whose values they do not take is undone.
+Status Statement::RunAndDeliver(bool& stopped) {
+    const std::uint64_t affected = outcome_.affected, count = run_.row_count;
+    const std::uint32_t executed = outcome_.executed;
+    IterationMark mark(UsedLink());
+    Status status = mark.Set();
+    stopped = !status.Ok();
+    if (stopped) return status;
+    if (status = RunCollected(stopped); !stopped) status = pieces_.Deliver(driver_);
+    if (stopped || status.Ok()) {
+        Status kept = mark.Keep();
+        return kept.Ok() ? status : kept;
+    }
+    bool is_undone = false;
+    Status undone = mark.Undo(is_undone);
+    if (!is_undone) return status;
+    outcome_.affected = affected;
+    outcome_.executed = executed;
+    run_.row_count = count;
+    return undone.Ok() ? status : undone;
 }

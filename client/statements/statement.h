@@ -178,6 +178,7 @@ private:
     Status StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments);
     Status ContinueExecute(ErrorHandle& error);
     Status RunCollected(bool& stopped);
+    Status RunAndDeliver(bool& stopped);
     [[nodiscard]] bool RunsByIteration() const;
 
     std::shared_ptr<StatementShare> share_;    // once a handle needs it

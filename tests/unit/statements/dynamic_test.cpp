@@ -382,6 +382,35 @@ TEST_F(Dynamic, CallbacksThatCallTheLibrary) {
     }
 }
 
+// An iteration whose values are not taken is undone, those before it stay; but not what a callback has committed.
+TEST_F(Dynamic, IterationsThatAreUndone) {
+    const struct { bool is_open; ub4 refused; const char* sql; const char* stored; ub4 count; } cases[] = {
+        {false, 0, nullptr, "-", 0}, {false, 1, nullptr, "v", 1}, {true, 0, nullptr, "open", 0},
+        {true, 1, nullptr, "open,v", 1}, {true, 1, "commit", "open,v,v", 2}, {true, 1, "rollback", "-", 2},
+        {false, 1, "insert into t values('by callback')", "v", 1}};
+    for (const auto& c : cases) {
+        MustRun("create table t(a varchar2(40))");
+        if (c.is_open) { MustRun("insert into t values('open')"); }
+        OCIStmt* const other = New<OCIStmt>(OCI_HTYPE_STMT);
+        Taker taker(9);
+        const auto take = taker.act;
+        taker.act = [&](Callback::Place& out) {
+            take(out);
+            if (taker.asked != (c.refused == 0 ? "0.0.0 " : "0.0.0 1.0.0 ")) return OCI_CONTINUE;
+            OCIStmt* const inner = std::exchange(stmt, other);
+            if (c.sql) { MustRun(c.sql); }
+            stmt = inner;
+            return OCI_ERROR;
+        };
+        ASSERT_EQ(Prepare("insert into t values('v') returning a into :1"), 0);
+        ASSERT_EQ(BindTo(1, nullptr, &taker), 0);
+        EXPECT_EQ(Execute(3), 24343);
+        EXPECT_EQ(RowCount(), c.count);
+        EXPECT_EQ(One("select nvl(group_concat(a, ','), '-') from t"), c.stored);
+        MustRun("drop table t");
+    }
+}
+
 class Utf16Dynamic : public Dynamic {
 protected:
     Utf16Dynamic() : Dynamic(OCI_UTF16) {}
