@@ -411,6 +411,31 @@ TEST_F(Dynamic, IterationsThatAreUndone) {
     }
 }
 
+// A callback without room for the rest cuts the value. What a row that failed gave back does not come out.
+TEST_F(Dynamic, CutValuesAndFailedRows) {
+    MustRun("create table t(a varchar2(40), b varchar2(40))");
+    Taker taker(3);
+    const auto take = taker.act;
+    taker.act = [&](Callback::Place& out) {
+        taker.room = out.piece == OCI_ONE_PIECE ? 3 : 0;
+        return take(out);
+    };
+    ASSERT_EQ(Prepare("select 'abcdef' from dual"), 0);
+    ASSERT_EQ(DefineTo(1, taker), 0);
+    EXPECT_EQ(Execute(1), 24345);
+    EXPECT_EQ(taker.Flush(), "abc|");
+    EXPECT_EQ(taker.indicator, 6);
+    EXPECT_EQ(taker.code, 1406);
+    Taker returned(9);
+    char in[2][5] = {"long", "s"}, narrow[2][2] = {};
+    ASSERT_EQ(Prepare("insert into t values('a', :1) returning a, b into :2, :3"), 0);
+    ASSERT_EQ(Bind(1, Text(in)), 0);
+    ASSERT_EQ(BindTo(2, nullptr, &returned), 0);
+    ASSERT_EQ(Bind(3, Text(narrow)), 0);
+    EXPECT_EQ(Execute(2, OCI_BATCH_ERRORS), 24381);
+    EXPECT_EQ(returned.asked, "1.0.0 ");
+}
+
 class Utf16Dynamic : public Dynamic {
 protected:
     Utf16Dynamic() : Dynamic(OCI_UTF16) {}
