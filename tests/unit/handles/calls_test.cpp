@@ -409,7 +409,7 @@ struct OwnMemory {
 TEST_F(CallsTest, InitializeServesEnvInit) {
     OwnMemory memory;
     ASSERT_EQ(
-        OCIInitialize(OCI_UTF16, &memory, OwnMemory::Allocate, OwnMemory::Reallocate, OwnMemory::Free), 0);
+        OCIInitialize(OCI_UTF16 | OCI_OBJECT, &memory, OwnMemory::Allocate, OwnMemory::Reallocate, OwnMemory::Free), 0);
     OCIEnv* env = nullptr;
     ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
     EXPECT_GT(memory.out, 0);
@@ -417,6 +417,7 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     ASSERT_EQ(OCIHandleAlloc(env, &handle, OCI_HTYPE_STMT, 9, &extra), OCI_SUCCESS);
     EXPECT_EQ(std::string(static_cast<char*>(extra), 9), std::string(9, '\0'));
     EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 1);
+    EXPECT_EQ(Attribute<ub4>(env, OCI_HTYPE_ENV, OCI_ATTR_OBJECT), 1u);
     EXPECT_EQ(Attribute<ub2>(env, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
     EXPECT_EQ(memory.out, 0);

@@ -239,17 +239,16 @@ TEST_F(ThreadCalls, BadArguments) {
     EXPECT_EQ(Answer(OCIThreadMutexInit(env_, err_, &mutex)), 21560) << "it lives already";
     EXPECT_EQ(mutex, before);
     boolean flag = 0;
-    const sword nulls[] = {
-        OCIThreadMutexInit(env_, err_, nullptr), OCIThreadMutexDestroy(env_, err_, nullptr),
-        OCIThreadMutexAcquire(env_, err_, nullptr), OCIThreadKeyInit(env_, err_, nullptr, nullptr),
-        OCIThreadKeyGet(env_, err_, key, nullptr), OCIThreadKeySet(env_, err_, nullptr, nullptr),
-        OCIThreadIdInit(env_, err_, nullptr), OCIThreadIdSet(env_, err_, id, nullptr),
-        OCIThreadIdSame(env_, err_, nullptr, id, &flag), OCIThreadIdSame(env_, err_, id, id, nullptr),
-        OCIThreadIdNull(env_, err_, id, nullptr), OCIThreadIdGet(env_, err_, nullptr),
-        OCIThreadHndInit(env_, err_, nullptr), OCIThreadJoin(env_, err_, nullptr),
-        OCIThreadClose(env_, err_, nullptr), OCIThreadHandleGet(env_, err_, nullptr)};
-    for (const sword code : nulls) EXPECT_EQ(code, OCI_ERROR) << &code - nulls;
-    EXPECT_EQ(Answer(OCIThreadHandleGet(env_, err_, nullptr)), 21560);
+    const sb4 nulls[] = {
+        Answer(OCIThreadMutexInit(env_, err_, nullptr)), Answer(OCIThreadMutexDestroy(env_, err_, nullptr)),
+        Answer(OCIThreadMutexAcquire(env_, err_, nullptr)), Answer(OCIThreadKeyInit(env_, err_, nullptr, nullptr)),
+        Answer(OCIThreadKeyGet(env_, err_, key, nullptr)), Answer(OCIThreadKeySet(env_, err_, nullptr, nullptr)),
+        Answer(OCIThreadIdInit(env_, err_, nullptr)), Answer(OCIThreadIdSet(env_, err_, id, nullptr)),
+        Answer(OCIThreadIdSame(env_, err_, nullptr, id, &flag)), Answer(OCIThreadIdSame(env_, err_, id, id, nullptr)),
+        Answer(OCIThreadIdNull(env_, err_, id, nullptr)), Answer(OCIThreadIdGet(env_, err_, nullptr)),
+        Answer(OCIThreadHndInit(env_, err_, nullptr)), Answer(OCIThreadJoin(env_, err_, nullptr)),
+        Answer(OCIThreadClose(env_, err_, nullptr)), Answer(OCIThreadHandleGet(env_, err_, nullptr))};
+    for (const sb4& answer : nulls) EXPECT_EQ(answer, 21560) << &answer - nulls;
     const sword foreign[] = {
         OCIThreadMutexAcquire(env_, err_, Bogus<OCIThreadMutex>()),
         OCIThreadKeySet(env_, err_, Bogus<OCIThreadKey>(), nullptr),

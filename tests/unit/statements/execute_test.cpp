@@ -44,11 +44,13 @@ TEST_F(Executing, WhatIsWrongWithTheCall) {
     MustRun("create table t(a number)");
     stmt = New<OCIStmt>(OCI_HTYPE_STMT);
     EXPECT_EQ(Execute(), 24337);
+    EXPECT_EQ(Prepare(""), 24373);
     const struct { const char* sql; ub4 iterations, first, mode; sb4 answer; } cases[] = {
         {"insert into t values(1)", 0, 0, OCI_DEFAULT, 24333}, {"insert into t values(1)", 2, 2, OCI_DEFAULT, 24333},
         {"insert into t values(1)", 1, 3, OCI_DEFAULT, 24333}, {"insert into t values(1)", 1, 0, 0x1000, 24300},
         {"insert into t values(1)", 1, 0, OCI_DESCRIBE_ONLY | OCI_PARSE_ONLY, 24380},
-        {"insert into t values(:a)", 1, 0, OCI_DEFAULT, 1008}, {"create table u(a number)", 2, 0, OCI_DEFAULT, 24969},
+        {"insert into t values(:a)", 1, 0, OCI_DEFAULT, 1008},
+        {"insert into t values(1) returning a into :b", 1, 0, OCI_DEFAULT, 1008}, {"create table u(a number)", 2, 0, OCI_DEFAULT, 24969},
         {"create table u as select :a from t", 1, 0, OCI_DEFAULT, 1027}, {"commit", 2, 0, OCI_DEFAULT, 24969},
         {"select * from t", 1, 0, OCI_DEFAULT, 24374}, {"select * from missing", 0, 0, OCI_DEFAULT, 942},
         {"select 'x from t", 0, 0, OCI_DEFAULT, 1756}, {"select 1; select 2", 0, 0, OCI_DEFAULT, 933},
@@ -65,8 +67,14 @@ TEST_F(Executing, SyntaxErrorsPointIntoTheText) {
     ASSERT_EQ(Ready("select :a, sysdate, from dual", {Text(dummy)}), 0);
     EXPECT_EQ(Execute(0), 900);
     EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 20);
-    ASSERT_EQ(Prepare("select 1 from dual"), 0);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
+    const struct { const char* sql; sb4 answer; ub2 offset; } cases[] = {
+        {"select 1 from dual", 0, 0}, {"select 2, 'x from dual", 1756, 10}, {"select 1 from dual", 0, 0}};
+    for (const auto& c : cases) {
+        ASSERT_EQ(Prepare(c.sql), 0);
+        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
+        EXPECT_EQ(Execute(0), c.answer);
+        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), c.offset);
+    }
 }
 
 TEST_F(Executing, TheMomentInDefaultsAndLists) {

@@ -102,6 +102,17 @@ TEST_F(PieceByPiece, ThatJustFits) {
     }
 }
 
+TEST_F(PieceByPiece, ValueThatHasNoneOfItsType) {
+    for (const bool second : {false, true}) {
+        ASSERT_EQ(Query(second ? "select '0a', '0ag' from dual" : "select '0ag', '0a' from dual",
+                        {InPieces(SQLT_BIN), InPieces(SQLT_BIN)}, 0), 0);
+        sword rc = FetchCode();
+        EXPECT_TRUE(!second || Piece(9, rc) == "\x0A");
+        EXPECT_EQ(Answer(rc), 1465) << second;
+        EXPECT_EQ(Fetch(), 1403) << "the row is given up";
+    }
+}
+
 TEST_F(PieceByPiece, OnlySomeTypes) {
     for (const ub2 type : {SQLT_INT, SQLT_FLT, SQLT_VNU, SQLT_DAT, SQLT_VCS, SQLT_CUR}) {
         char area[8];

@@ -301,7 +301,7 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {Raw<sb1>(-5), SQLT_INT, -1, "-5"}, {Raw<sb8>(INT64_MIN), SQLT_INT, -1, "-9223372036854775808"},
         {Raw<ub1>(200), SQLT_UIN, -1, "200"}, {Raw(0.1f), SQLT_FLT, -1, "0.1"}, {Raw(-0.25), SQLT_FLT, -1, "-0.25"},
         {bytes("\x12\x34\x5D", 3), SQLT_PDN, -1, "-12345"}, {bytes("\x12\x34\x55", 3), SQLT_PDN, -1, "!1413"},
-        {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"},
+        {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"}, {std::string(200, '\x99') + '\x9C', SQLT_PDN, -1, "!1426"},
         {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"},
         {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
         {Raw(ub8{698} << 53 | 1), SQLT_BFLOAT, -1, "!1426"},    // 1E300
@@ -368,6 +368,8 @@ TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
         EXPECT_EQ(Hex(Out(c.expression, c.type, c.size)), c.hex) << Shown(c.expression, c.type, c.size);
         EXPECT_EQ(length_, c.length) << Shown(c.expression, c.type, c.size);
     }
+    for (const ub2 type : {SQLT_CHR, SQLT_STR, SQLT_AFC, SQLT_VCS, SQLT_LVC})
+        EXPECT_EQ(Out("cast(x'C3' as text)", type, 8), "!24365") << type << ": no UTF-8";
     std::string in = Encoded("abc");
     std::string terminated = Encoded("xy") + std::string(2, '\0');
     sb4 count = 0;
