@@ -155,6 +155,7 @@
 #define OCI_ATTR_LOBPREFETCH_LENGTH 440         /* define: boolean, RW */
 #define OCI_ATTR_FETCH_ROWID 448                /* stmt: boolean, W */
 #define OCI_ATTR_UB8_ROW_COUNT 457              /* stmt: ub8, R */
+#define OCI_ATTR_SPOOL_WAIT_TIMEOUT 506         /* spool: ub4, RW */
 #define OCI_ATTR_CALL_TIMEOUT 531               /* svcctx: ub4, RW */
 
 /* Of parameters and described objects. */

@@ -201,6 +201,7 @@
 #define OCI_SPOOL_ATTRVAL_WAIT 0
 #define OCI_SPOOL_ATTRVAL_NOWAIT 1
 #define OCI_SPOOL_ATTRVAL_FORCEGET 2
+#define OCI_SPOOL_ATTRVAL_TIMEDWAIT 3
 
 /* Getting and releasing a session. */
 #define OCI_SESSGET_SPOOL 0x1

@@ -189,6 +189,7 @@ struct Credentials {
     std::string user;         // empty with external: the operating-system user
     std::string password;
     bool external = false;    // a logon with null user and password
+    bool operator==(const Credentials&) const = default;
 };
 
 // One user's session on a database.

@@ -10,6 +10,7 @@
 #include "handles/gate.h"
 #include "handles/plain_objects.h"
 #include "oci.h"
+#include "pools/pool_handle.h"
 #include "sessions/service_context.h"
 #include "statements/result_set.h"
 #include "values/rowid_descriptor.h"
@@ -57,8 +58,8 @@ constexpr Maker kHandles[] = {
     {OCI_HTYPE_XADGRANULE, Make<PlainHandle>},
     {OCI_HTYPE_XADRECORD, Make<PlainHandle>},
     {OCI_HTYPE_XADIO, Make<PlainHandle>},
-    {OCI_HTYPE_CPOOL, Make<PlainHandle>},
-    {OCI_HTYPE_SPOOL, Make<PlainHandle>},
+    {OCI_HTYPE_CPOOL, Make<ConnectionPool>},
+    {OCI_HTYPE_SPOOL, Make<SessionPool>},
     {OCI_HTYPE_ADMIN, Make<PlainHandle>},
     {OCI_HTYPE_EVENT, Make<PlainHandle>},
 };

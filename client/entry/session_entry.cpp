@@ -3,48 +3,39 @@
 // itself, one link's at a time: a session may be another context's, and another thread may end it meanwhile.
 #include <string>
 
-#include "entry/call_text.h"
+#include "entry/logon_text.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 #include "oci.h"
+#include "pools/pool_handle.h"
 #include "sessions/service_context.h"
 
 namespace {
 
 constexpr ub4 kPasswordChangeLogsOn = OCI_AUTH;
 
-Status ReadText(const Environment& environment, const OraText* text, ub4 length, std::string& utf8) {
-    const CallText in(environment, text, length, false);
-    if (!in.Valid()) return Error(errors::kBadText);
-    utf8 = in.View();
+Status CheckLogonMode(ub4 mode) {
+    constexpr ub4 kPools = OCI_LOGON2_CPOOL | OCI_LOGON2_SPOOL;
+    if (mode & OCI_LOGON2_PROXY) return Error(errors::kProxyUnsupported);
+    if (mode & ~(kPools | OCI_LOGON2_STMTCACHE) || (mode & kPools) == kPools) return Error(errors::kBadMode);
     return {};
 }
 
-Status ReadDatabase(const Environment& environment, const OraText* text, ub4 length, std::string& database) {
-    if (!text && length != 0) return Error(errors::kLengthWithoutText);
-    return ReadText(environment, text, length, database);
-}
-
-// Without a name and a password it is the operating-system user.
-Status CheckCredentials(engine::Credentials& credentials) {
-    credentials.external = credentials.user.empty() && credentials.password.empty();
-    if (credentials.external) return {};
-    if (credentials.user.empty()) return Error(errors::kBadLogon);
-    return credentials.password.empty() ? Error(errors::kNoPassword) : Status();
-}
-
-Status ReadCredentials(const Environment& environment, const OraText* user, ub4 user_length, const OraText* password,
-                       ub4 password_length, engine::Credentials& credentials) {
-    Status status = ReadText(environment, user, user_length, credentials.user);
-    if (status.Ok()) status = ReadText(environment, password, password_length, credentials.password);
-    return status.Ok() ? CheckCredentials(credentials) : status;
-}
-
-Status CheckLogonMode(ub4 mode) {
-    if (mode & OCI_LOGON2_CPOOL) return Error(errors::kNoConnectionPool);
-    if (mode & OCI_LOGON2_SPOOL) return Error(errors::kNoSessionPool);
-    if (mode & OCI_LOGON2_PROXY) return Error(errors::kProxyUnsupported);
-    return mode & ~static_cast<ub4>(OCI_LOGON2_STMTCACHE) ? Error(errors::kBadMode) : Status();
+// What the context is to be attached to: a database, or a pool of that name. `cache` is set to the pool's cache size.
+Status FindTarget(const Environment& environment, std::string_view name, ub4 mode, ServiceContext::Target& target,
+                  ub4& cache) {
+    if (mode & OCI_LOGON2_STMTCACHE) cache = ServiceContext::kDefaultCacheSize;
+    if (!(mode & (OCI_LOGON2_CPOOL | OCI_LOGON2_SPOOL))) {
+        target.database = name;
+        return {};
+    }
+    std::shared_ptr<Pool> pool;
+    const Kind kind = mode & OCI_LOGON2_SPOOL ? Kind::session_pool : Kind::connection_pool;
+    Status status = FindPool(environment, kind, name, pool);
+    if (status.Failed()) return status;
+    if (const ub4 size = pool->Settings().cache_size) cache = size;
+    target.source = std::make_shared<PoolSource>(std::move(pool), SessionWish());
+    return status;
 }
 
 struct LogonTexts {
@@ -66,6 +57,9 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
     status =
         ReadCredentials(environment, texts.user, texts.user_length, texts.password, texts.password_length, credentials);
     if (status.Ok()) status = ReadDatabase(environment, texts.database, texts.database_length, database);
+    ServiceContext::Target target;
+    ub4 cache = 0;
+    if (status.Ok()) status = FindTarget(environment, database, mode, target, cache);
     if (status.Failed()) return status;
 
     auto* service = Live<ServiceContext>(*out);
@@ -74,12 +68,19 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
         made.reset(Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0));
         service = made.get();
     }
-    status = service->LogOn(database, credentials);
+    status = service->LogOn(target, credentials, ServiceContext::EndedBy::logoff);
     if (status.Failed()) return status;
-    if (mode & OCI_LOGON2_STMTCACHE) service->statement_cache_size = ServiceContext::kDefaultCacheSize;
+    if (cache > 0) service->statement_cache_size = cache;
     *out = AsHandle<OCISvcCtx>(service);
     (void)made.release();
     return status;
+}
+
+Status AttachToPool(Server& server, std::string_view name) {
+    std::shared_ptr<Pool> pool;
+    Status status = FindPool(server.Env(), Kind::connection_pool, name, pool);
+    if (status.Failed()) return status;
+    return server.Attach(std::make_shared<PoolSource>(std::move(pool), SessionWish()));
 }
 
 Status BeginSession(ServiceContext& service, Session& session, ub4 kind, ub4 mode) {
@@ -197,11 +198,11 @@ sword OCILogoff(OCISvcCtx* svc, OCIError* err) {
 sword OCIServerAttach(OCIServer* srv, OCIError* err, const OraText* db, sb4 dbLen, ub4 mode) {
     return Enter<Server>(srv, err, [&](Server& server) -> Status {
         const LongCall may_take_long;
-        if (mode & OCI_CPOOL) return Error(errors::kNoConnectionPool);
-        if (mode != OCI_DEFAULT) return Error(errors::kBadMode);
+        if (mode != OCI_DEFAULT && mode != OCI_CPOOL) return Error(errors::kBadMode);
         if (dbLen < 0) return Error(errors::kNullArgument);
         std::string database;
         Status status = ReadDatabase(server.Env(), db, static_cast<ub4>(dbLen), database);
+        if (status.Ok() && mode == OCI_CPOOL) return AttachToPool(server, database);
         return status.Ok() ? server.Attach(database) : status;
     });
 }
@@ -210,7 +211,7 @@ sword OCIServerAttach(OCIServer* srv, OCIError* err, const OraText* db, sb4 dbLe
 sword OCIServerDetach(OCIServer* srv, OCIError* err, ub4) {
     return Enter<Server>(srv, err, [](Server& server) {
         const LongCall may_take_long;
-        return server.Detach();
+        return ServiceContext::IsOfObtained(server) ? Error(errors::kMustRelease) : server.Detach();
     });
 }
 
@@ -226,7 +227,8 @@ sword OCISessionEnd(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4) {
     return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext&) {
         auto* session = Live<Session>(ses);
         const LongCall may_take_long;
-        return session ? session->End() : InvalidHandle();
+        if (!session) return InvalidHandle();
+        return ServiceContext::IsOfObtained(*session) ? Error(errors::kMustRelease) : session->End();
     });
 }
 

@@ -75,6 +75,7 @@ void ObjectTree::Unlink(Object& object) noexcept {
 // Takes the object and all below it out of the set of living objects; false when the object was out already.
 bool ObjectTree::Withdraw(Object& object) noexcept {
     const bool was_living = live::Erase(&object);
+    object.Withdrawn();
     for (Object* child = object.first_child_; child; child = child->next_) Withdraw(*child);
     return was_living;
 }

@@ -60,6 +60,10 @@ public:
     // Whether OCIHandleFree must refuse (24386).
     [[nodiscard]] virtual bool InUse() const { return false; }
 
+    // No call finds the object any more; it is destroyed when the last one that may know it has ended. For waking those
+    // who wait in it. Under the lock of the environment's tree: nothing may be made or destroyed.
+    virtual void Withdrawn() noexcept {}
+
 protected:
     // For objects that become something else in place; live::Retype goes with it.
     void SetType(TypeCode type) { type_ = type; }

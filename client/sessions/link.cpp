@@ -31,12 +31,19 @@ void LinkUser::Use(std::shared_ptr<Link> link) noexcept {
     link_.Set(std::move(link));
 }
 
-Link::Link(std::shared_ptr<engine::Database> database, std::unique_ptr<engine::Connection> connection,
-           std::shared_ptr<engine::StopRequest> stop, bool threaded)
-    : database_(std::move(database)),
-      stop_(std::move(stop)),
-      connection_(std::move(connection)),
+Link::Link(bool threaded)
+    : stop_(std::make_shared<engine::StopRequest>()),
       serial_(threaded ? std::make_shared<std::recursive_mutex>() : nullptr) {}
+
+void Link::Open(Connected connected) noexcept {
+    database_ = std::move(connected.database);
+    user = std::move(connected.user);
+    place_ = std::move(connected.place);
+    statement_cache = std::move(connected.statement_cache);
+    const std::lock_guard lock(cancel_mutex_);
+    connection_ = std::move(connected.connection);
+    connection_->Obey(stop_);
+}
 
 Link::~Link() { Close(); }
 
@@ -93,11 +100,11 @@ void Link::DropUsers(void (LinkUser::*told)() noexcept) noexcept {
         (user->*told)();
         user->Use(nullptr);
     }
-    statement_cache.reset();
 }
 
 std::unique_ptr<engine::Connection> Link::Exchange(std::unique_ptr<engine::Connection> next) noexcept {
     DropUsers(&LinkUser::ConnectionChanged);
+    statement_cache.reset();
     next->Obey(stop_);
     const std::lock_guard lock(cancel_mutex_);
     connection_.swap(next);
@@ -106,10 +113,21 @@ std::unique_ptr<engine::Connection> Link::Exchange(std::unique_ptr<engine::Conne
 
 void Link::Close() noexcept {
     const SerialLock serial(serial_);    // calls on statements of the link may be running
+    const Connected gone = TakeApart();
+}
+
+void Link::GiveBack(GivingBack how) noexcept {
+    const SerialLock serial(serial_);
+    Connected connected = TakeApart();
+    if (LinkPlace* place = connected.place.get()) place->TakeBack(std::move(connected), std::move(how));
+}
+
+// What goes does so in the hands of the caller, after the lock.
+Connected Link::TakeApart() noexcept {
     DropUsers(&LinkUser::LinkClosed);
     branch.reset();
     spare.reset();
-    std::unique_ptr<engine::Connection> ended;    // rolls back when it goes, after the lock
+    local_started = false;
     const std::lock_guard lock(cancel_mutex_);
-    ended = std::move(connection_);
+    return {database_, user, std::move(place_), std::move(connection_), std::move(statement_cache)};
 }

@@ -1,11 +1,13 @@
 // A link: one user session's connection to its engine, and the wish to stop what runs on it. Service contexts and
 // statements share it; when the session ends the link closes, everything made from the connection is dropped first, and
-// who still holds the link finds it closed.
+// who still holds the link finds it closed. A connection out of a pool goes back there and serves later sessions, each
+// through a link of its own: what still knows a former link does nothing to a later session.
 #pragma once
 
 #include <cstdint>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <string>
 
 #include "engine/engine.h"
@@ -64,11 +66,38 @@ struct LinkBranch : LinkData {
     virtual Status Check(bool in_transaction) = 0;
 };
 
+class Session;
+struct Connected;
+
+// How a session is given back to its pool.
+struct GivingBack {
+    bool drop = false;                 // the connection is to be closed
+    std::optional<std::string> tag;    // what it is to be known by from now on
+};
+
+// A connection's place in a pool, which goes with it: when it goes, the pool has one connection less.
+class LinkPlace {
+public:
+    virtual ~LinkPlace() = default;
+    // A session has begun; under the serial lock of its link. False when the pool has gone meanwhile.
+    [[nodiscard]] virtual bool Serve(Session& session, const std::shared_ptr<Link>& link) noexcept = 0;
+    // The connection, with its place in it.
+    virtual void TakeBack(Connected connected, GivingBack how) noexcept = 0;
+};
+
+// A connection and what lasts as long. They go in the opposite order: the cached statements first.
+struct Connected {
+    std::shared_ptr<engine::Database> database;
+    std::string user;    // who is logged on; empty: the operating-system user
+    std::unique_ptr<LinkPlace> place;    // null: it is nobody else's
+    std::unique_ptr<engine::Connection> connection;
+    std::unique_ptr<LinkData> statement_cache;
+};
+
 class Link {
 public:
-    // `threaded`: calls on the link are serialised. The connection heeds `stop`.
-    Link(std::shared_ptr<engine::Database> database, std::unique_ptr<engine::Connection> connection,
-         std::shared_ptr<engine::StopRequest> stop, bool threaded);
+    // Closed as yet. `threaded`: calls on the link are serialised.
+    explicit Link(bool threaded);
     ~Link();
     Link(const Link&) = delete;
     Link& operator=(const Link&) = delete;
@@ -76,7 +105,12 @@ public:
     [[nodiscard]] bool Closed() const { return !connection_; }
     [[nodiscard]] engine::Connection& Engine() { return *connection_; }    // not when closed
     [[nodiscard]] engine::Database& Database() { return *database_; }
+    [[nodiscard]] LinkPlace* Place() { return place_.get(); }    // null when the connection is out of no pool
     [[nodiscard]] const std::shared_ptr<std::recursive_mutex>& Serial() const { return serial_; }
+
+    // For the first time; the connection heeds the link's wish to stop.
+    void Open(Connected connected) noexcept;
+    [[nodiscard]] const std::shared_ptr<engine::StopRequest>& Stop() const { return stop_; }
 
     // Stops the call that runs on the connection, or the next one that executes or fetches; forgets a stop that met
     // none. From any thread.
@@ -100,6 +134,8 @@ public:
 
     // Drops what depends on the connection, and the connection: what is open is rolled back.
     void Close() noexcept;
+    // The same, but a connection out of a pool goes back there. Nothing may be open on it.
+    void GiveBack(GivingBack how) noexcept;
 
     std::unique_ptr<LinkData> statement_cache;
     std::unique_ptr<LinkBranch> branch;                  // null: the session's work is its own
@@ -114,9 +150,11 @@ private:
     void Remove(LinkUser& user) noexcept;
     LinkUser* AnyUser() noexcept;
     void DropUsers(void (LinkUser::*told)() noexcept) noexcept;
+    Connected TakeApart() noexcept;    // under the serial lock
 
-    const std::shared_ptr<engine::Database> database_;
+    std::shared_ptr<engine::Database> database_;
     const std::shared_ptr<engine::StopRequest> stop_;
+    std::unique_ptr<LinkPlace> place_;
     std::unique_ptr<engine::Connection> connection_;
     std::shared_ptr<std::recursive_mutex> serial_;
     std::mutex cancel_mutex_;    // between Cancel and the end of the connection

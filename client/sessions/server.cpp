@@ -94,21 +94,47 @@ Status Server::Attach(std::string_view database) {
     if (Attached()) return Error(errors::kAlreadyAttached);
     std::unique_ptr<engine::Database> opened;
     Status status = engine::Open(database, opened);
-    if (status.Failed()) return status;
-    name_ = database;
-    std::shared_ptr<engine::Database> shared = std::move(opened);
+    return status.Failed() ? status : Attach(std::move(opened), std::string(database), nullptr);
+}
+
+Status Server::Attach(std::shared_ptr<ConnectionSource> source) {
+    const SerialLock turn(serial_);
+    if (Attached()) return Error(errors::kAlreadyAttached);
+    return Attach(source->GetDatabase(), source->DatabaseName(), source);
+}
+
+Status Server::Attach(std::shared_ptr<engine::Database> database, std::string name,
+                      std::shared_ptr<ConnectionSource> source) {
+    name_ = std::move(name);
     const std::lock_guard lock(mutex_);
-    database_ = std::move(shared);
-    return status;
+    database_ = std::move(database);
+    source_ = std::move(source);
+    return {};
+}
+
+Status Server::Connect(const engine::Credentials& credentials, std::shared_ptr<const engine::StopRequest> stop,
+                       Connected& connected) const {
+    std::shared_ptr<ConnectionSource> source;
+    {
+        const std::lock_guard lock(mutex_);
+        connected.database = database_;
+        source = source_;
+    }
+    if (!connected.database) return Error(errors::kNotConnected);
+    if (source) return source->Take(credentials, connected);
+    if (!credentials.external) connected.user = credentials.user;
+    return connected.database->Connect(credentials, std::move(stop), connected.connection);
 }
 
 // No session joins any more once the database is taken away.
 Status Server::Detach() {
     const SerialLock turn(serial_);
     std::shared_ptr<engine::Database> detached;
+    std::shared_ptr<ConnectionSource> source;
     {
         const std::lock_guard lock(mutex_);
         detached = std::exchange(database_, nullptr);
+        source = std::exchange(source_, nullptr);
     }
     if (!detached) return Error(errors::kNotConnected);
     DropSessions();

@@ -18,6 +18,17 @@
 
 class Link;
 class Session;
+struct Connected;
+
+// Where the sessions of a server get their connections from, when that is not the database itself: a pool.
+class ConnectionSource {
+public:
+    virtual ~ConnectionSource() = default;
+    [[nodiscard]] virtual const std::shared_ptr<engine::Database>& GetDatabase() const = 0;
+    [[nodiscard]] virtual const std::string& DatabaseName() const = 0;
+    // A connection of that user's, or the pool's own where none is named. `connected` is set unless the call fails.
+    virtual Status Take(const engine::Credentials& credentials, Connected& connected) = 0;
+};
 
 class Server : public Object {
 public:
@@ -32,10 +43,15 @@ public:
     [[nodiscard]] const std::string& DatabaseName() const { return name_; }    // under the serial lock
 
     Status Attach(std::string_view database);
+    Status Attach(std::shared_ptr<ConnectionSource> source);
     Status Detach();    // sessions that are still begun are dropped: what they did not commit is rolled back
 
     // What is attached; null when nothing is.
     [[nodiscard]] std::shared_ptr<engine::Database> AttachedDatabase() const;
+
+    // Connects a session: 3114 when nothing is attached.
+    Status Connect(const engine::Credentials& credentials, std::shared_ptr<const engine::StopRequest> stop,
+                   Connected& connected) const;
 
     // Sessions that are begun and not ended, and their links. A session cannot join when the server is no longer
     // attached to the database that it has connected to.
@@ -56,6 +72,8 @@ private:
         std::shared_ptr<Link> link;
     };
 
+    Status Attach(std::shared_ptr<engine::Database> database, std::string name,
+                  std::shared_ptr<ConnectionSource> source);
     void DropSessions() noexcept;
     [[nodiscard]] BegunSession LastBegun() const;
     [[nodiscard]] bool Joined(const BegunSession& begun) const;
@@ -65,6 +83,7 @@ private:
     const bool own_;    // made by a logon and below its service context
     mutable std::mutex mutex_;    // of what follows; nothing else is locked or called while it is held
     std::shared_ptr<engine::Database> database_;    // null when detached
+    std::shared_ptr<ConnectionSource> source_;      // null: the database itself
     std::string name_;
     std::vector<BegunSession> sessions_;
 };

@@ -118,7 +118,7 @@ Session& ServiceContext::OwnSession() {
     return *own_session_;
 }
 
-Status ServiceContext::LogOn(std::string_view database, const engine::Credentials& credentials) {
+Status ServiceContext::LogOn(const Target& target, const engine::Credentials& credentials, EndedBy ended_by) {
     const SerialLock changing(changing_);
     if (logged_on_) {
         Status ended = LogOff();
@@ -126,33 +126,53 @@ Status ServiceContext::LogOn(std::string_view database, const engine::Credential
     }
     Server& server = OwnServer();
     Session& session = OwnSession();
-    Status status = server.Attach(database);
+    Status status = target.source ? server.Attach(target.source) : server.Attach(target.database);
     if (status.Failed()) return status;
     status = session.Begin(server, credentials);
     if (status.Failed()) {
         (void)server.Detach();    // it has nothing open: the logon's own error is what counts
         return status;
     }
-    session.user = credentials.user;
+    if (const std::shared_ptr<Link> link = session.ShareLink()) session.user = link->user;
     server_ = &server;
     session_ = &session;
+    obtained_ = ended_by == EndedBy::release;
     logged_on_ = true;
     return status;
 }
 
 Status ServiceContext::LogOff() {
     const SerialLock changing(changing_);
+    if (obtained_) return Error(errors::kMustRelease);
     Session* session = GetSession();
     std::shared_ptr<Link> link;
     Status status = Require(link);
     if (status.Failed()) return status;
     status = session ? session->End() : Error(errors::kNotLoggedOn);
-    if (status.Failed() || !logged_on_) return status;
+    return status.Failed() || !logged_on_ ? status : Forget();
+}
+
+Status ServiceContext::Release(GivingBack how) {
+    const SerialLock changing(changing_);
+    if (!obtained_) return Error(errors::kCannotRelease);
+    Status status = own_session_->End(&how);
+    if (status.Failed() && own_session_->Begun()) return status;
+    const Status detached = Forget();
+    return status.Failed() ? status : detached;
+}
+
+Status ServiceContext::Forget() {
     statement_cache_size = 0;
     server_ = nullptr;
     session_ = nullptr;
     logged_on_ = false;
+    obtained_ = false;
     return own_server_->Detach();
+}
+
+bool ServiceContext::IsOfObtained(const Object& own) {
+    const Object* parent = own.Parent();
+    return parent && parent->Type() == OCI_HTYPE_SVCCTX && static_cast<const ServiceContext*>(parent)->Obtained();
 }
 
 SessionTurn::SessionTurn(ServiceContext& service) {

@@ -43,20 +43,36 @@ public:
     Status SetTransaction(TransactionHandle* transaction);
 
     [[nodiscard]] bool LoggedOn() const { return logged_on_; }
-    Status LogOn(std::string_view database, const engine::Credentials& credentials);
-    Status LogOff();    // commits; an error leaves the session as it was
+    // What a logon attaches the context's own server to.
+    struct Target {
+        std::string_view database;
+        std::shared_ptr<ConnectionSource> source;    // null: the database
+    };
+    // Who is to end the session: a logoff, or the release of what OCISessionGet gave.
+    enum class EndedBy : std::uint8_t { logoff, release };
+    Status LogOn(const Target& target, const engine::Credentials& credentials, EndedBy ended_by);
+    Status LogOff();    // commits; an error leaves the session as it was. 24420 when it is to be released
+    // The same; 24421 when nothing is to be released. A session that broke, or is gone, is ended all the same.
+    Status Release(GivingBack how);
+    [[nodiscard]] bool Obtained() const { return obtained_; }    // to be released
+    // Whether a server or a session is the own one of such a context.
+    [[nodiscard]] static bool IsOfObtained(const Object& own);
     // The session that the context is to be used with when the application set none: the context's own.
     Session& OwnSession();
 
     std::atomic<std::uint32_t> statement_cache_size{0};    // 0: no cache
 
+    std::string tag;    // of the session that was got, as the application reads it
+
 private:
     Server& OwnServer();
+    Status Forget();    // the session has ended
 
     std::atomic<const void*> server_{nullptr};     // read from any thread
     std::atomic<const void*> session_{nullptr};
     std::atomic<const void*> transaction_{nullptr};
     std::atomic<bool> logged_on_{false};            // by a logon call: server and session are read-only
+    std::atomic<bool> obtained_{false};
     const std::shared_ptr<std::recursive_mutex> changing_;    // null in an environment without threads; of the next
     Server* own_server_ = nullptr;      // children; InUse keeps the application from freeing them
     Session* own_session_ = nullptr;

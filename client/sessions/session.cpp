@@ -73,27 +73,36 @@ Status Session::Begin(Server& server, const engine::Credentials& credentials) {
     return ShareLink() ? Error(errors::kAlreadyAuthenticated) : Connect(server, credentials);
 }
 
+// A session that cannot join gives the connection back.
 Status Session::Connect(Server& server, const engine::Credentials& credentials) {
-    std::shared_ptr<engine::Database> database = server.AttachedDatabase();
-    if (!database) return Error(errors::kNotConnected);
-    auto stop = std::make_shared<engine::StopRequest>();
-    std::unique_ptr<engine::Connection> connection;
-    Status status = database->Connect(credentials, stop, connection);
+    auto link = std::make_shared<Link>(Env().Threaded());
+    Connected connected;
+    Status status = server.Connect(credentials, link->Stop(), connected);
     if (status.Failed()) return status;
-    auto link = std::make_shared<Link>(database, std::move(connection), std::move(stop), Env().Threaded());
-    if (!credentials.external) link->user = credentials.user;
+    link->Open(std::move(connected));
+    struct Undo {
+        Link* link;
+        ~Undo() { if (link) link->GiveBack({}); }
+    } undo{link.get()};
     const SerialLock serial(link->Serial());
-    if (!server.Join(*this, link, *database)) return Error(errors::kNotConnected);
+    if (!server.Join(*this, link, link->Database())) return Error(errors::kNotConnected);
+    if (link->Place() && !link->Place()->Serve(*this, link)) {
+        server.Leave(*this);
+        return Error(errors::kNotConnected);
+    }
+    undo.link = nullptr;
     server_ = &server;
     link_.Set(std::move(link));
     return status;
 }
 
-Status Session::End() {
+Status Session::End(GivingBack* released) {
     const Turn turn(*this);
     if (!turn.link) return Error(errors::kNotLoggedOn);
     Status status = turn.link->Commit();
-    if (!status.Failed()) Drop();
+    if (status.Failed() && !(released && turn.link->Engine().Broken())) return status;
+    turn.link->GiveBack(released ? std::move(*released) : GivingBack());
+    Leave();
     return status;
 }
 
@@ -108,6 +117,10 @@ void Session::Drop() noexcept {
     const Turn turn(*this);
     if (!turn.link) return;
     turn.link->Close();
+    Leave();
+}
+
+void Session::Leave() noexcept {
     std::exchange(server_, nullptr)->Leave(*this);
     link_.Set(nullptr);    // last: who frees the session waits for the lock as long as it has a link
 }

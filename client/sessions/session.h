@@ -32,7 +32,8 @@ public:
     [[nodiscard]] std::shared_ptr<Link> ShareLink() const { return link_.Share(); }    // without the serial lock
 
     Status Begin(Server& server, const engine::Credentials& credentials);
-    Status End();             // commits; an error leaves the session as it was
+    // Commits; an error leaves the session as it was, but for a broken one that is to be `released`.
+    Status End(GivingBack* released = nullptr);
     // On the session's own connection: error 1012 when it is not begun.
     Status ChangePassword(const std::string& user_name, const std::string& old_password,
                           const std::string& new_password);
@@ -52,6 +53,7 @@ public:
 
 private:
     Status Connect(Server& server, const engine::Credentials& credentials);
+    void Leave() noexcept;    // the link is closed
     class Turn;
 
     const bool own_;

@@ -28,6 +28,7 @@ void StatementCache::Drop(std::size_t index) noexcept {
     Statement* statement = kept_[index];
     kept_.erase(kept_.begin() + static_cast<std::ptrdiff_t>(index));
     statement->kept_in = nullptr;
+    statement->LinkClosed();    // the connection may go before the statement does
     Destroy(statement);
 }
 
@@ -61,6 +62,7 @@ void StatementCache::Keep(Statement& statement, std::string_view key) {
     if (Statement* before = key.empty() ? TakeByText(statement.Text()) : TakeByKey(key)) Destroy(before);
     statement.Rest();
     live::Retype(&statement, Kind::none);
+    statement.Join(nullptr);
     statement.kept_in = this;
     kept_.push_back(&statement);
     if (kept_.size() > capacity_) Drop(0);
@@ -75,9 +77,12 @@ Status PrepareThroughCache(ServiceContext& service, const PrepareRequest& reques
     const std::shared_ptr<Link>& link = turn.link;
     StatementCache* cache = CacheOf(service, *link);
     statement = cache && !request.key.empty() ? cache->TakeByKey(request.key) : nullptr;
-    if (statement) return {};
-    if (cache && !request.text.empty()) statement = cache->TakeByText(request.text);
-    if (statement) return request.key.empty() ? Status() : Warning(errors::kUntagged);
+    const bool by_key = statement;
+    if (!by_key && cache && !request.text.empty()) statement = cache->TakeByText(request.text);
+    if (statement) {
+        statement->Join(link);
+        return by_key || request.key.empty() ? Status() : Warning(errors::kUntagged);
+    }
     if (request.search_only || request.text.empty()) return Error(errors::kNotInCache);
     Statement* made = Create<Statement>(service.Env(), OCI_HTYPE_STMT, 0);
     try {
