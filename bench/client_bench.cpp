@@ -311,7 +311,50 @@ ub8 PiecesBare(const Bare& bare) {
     return bytes;
 }
 
+// A pool of one session that is there before anybody asks for it.
+class WarmPool {
+public:
+    explicit WarmPool(const std::string& database) : session_(":memory:"), database_(database) {
+        OCIHandleAlloc(session_.env, reinterpret_cast<dvoid**>(&pool_), OCI_HTYPE_SPOOL, 0, nullptr);
+        session_.Check(OCISessionPoolCreate(session_.env, session_.err, pool_, &name_, &length_, Text(database_),
+                                            Size(database_), 1, 1, 1, Text(kUser), Size(kUser), Text(kPassword),
+                                            Size(kPassword), OCI_SPC_HOMOGENEOUS));
+    }
+    void GetAndRelease() {
+        OCISvcCtx* svc = nullptr;
+        session_.Check(OCISessionGet(session_.env, session_.err, &svc, nullptr, name_, length_, nullptr, 0, nullptr,
+                                     nullptr, nullptr, OCI_SESSGET_SPOOL));
+        session_.Check(OCISessionRelease(svc, session_.err, nullptr, 0, OCI_DEFAULT));
+    }
+    void LogOnAndOff() {
+        OCISvcCtx* svc = nullptr;
+        session_.Check(OCILogon(session_.env, session_.err, &svc, Text(kUser), Size(kUser), Text(kPassword),
+                                Size(kPassword), Text(database_), Size(database_)));
+        session_.Check(OCILogoff(svc, session_.err));
+        OCIHandleFree(svc, OCI_HTYPE_SVCCTX);
+    }
+
+private:
+    static inline const std::string kUser = "ann", kPassword = "secret";
+    static OraText* Text(const std::string& text) {
+        return reinterpret_cast<OraText*>(const_cast<char*>(text.c_str()));
+    }
+    static ub4 Size(const std::string& text) { return static_cast<ub4>(text.size()); }
+
+    Session session_;
+    std::string database_;
+    OCISPool* pool_ = nullptr;
+    OraText* name_ = nullptr;
+    ub4 length_ = 0;
+};
+
 void Run(const std::string& folder, int runs) {
+    WarmPool pool(folder + "/pool.db");
+    const auto times = [](int count, auto work) { for (int done = 0; done < count; ++done) work(); };
+    constexpr int kLogons = 20;
+    Pair("logon and logoff / get and release, at least", 100, runs,
+         [&] { times(kLogons, [&] { pool.LogOnAndOff(); }); },
+         [&] { times(kLogons, [&] { pool.GetAndRelease(); }); });
     const std::string ours = folder + "/ours.db";
     const std::string theirs = folder + "/theirs.db";
     Pair("array insert of 200,000 rows by 1,000 / bare loop", 1.5, runs,

@@ -99,8 +99,9 @@ Status ReadCredentials(const Session* authentication, ub4 mode, engine::Credenti
     return {};
 }
 
-// Reads the target: a database, or a pool and the wish for its session. `cache` is set to the size of the cache.
-Status FindTarget(const Environment& environment, const GetRequest& request, ub4 mode, ServiceContext::Target& target,
+// The target: a database, or a pool and the wish for its session. `cache` is set to the size of the cache; where no user
+// is named it is the pool's own.
+Status FindTarget(const Environment& environment, GetRequest& request, ub4 mode, ServiceContext::Target& target,
                   ub4& cache) {
     if (mode & OCI_SESSGET_STMTCACHE) cache = ServiceContext::kDefaultCacheSize;
     if (!(mode & kFromPools)) {
@@ -115,6 +116,7 @@ Status FindTarget(const Environment& environment, const GetRequest& request, ub4
     if (mode & OCI_SESSGET_CREDEXT && pool->Plan().one_user && !pool->Plan().own.external)
         return Error(errors::kBadMode);
     if (const ub4 size = pool->Settings().cache_size) cache = size;
+    if (request.credentials.external && !(mode & OCI_SESSGET_CREDEXT)) request.credentials = pool->Plan().own;
     target.source = std::make_shared<PoolSource>(std::move(pool), request.wish);
     return status;
 }
@@ -138,17 +140,17 @@ void ShowTag(ServiceContext& service, const std::string& wished, const GetResult
     if (result.found) *result.found = tag == wished ? TRUE : FALSE;
 }
 
-Status GetSession(Environment& environment, const GetRequest& request, ub4 mode, const GetResult& result) {
+Status GetSession(Environment& environment, GetRequest& request, ub4 mode, const GetResult& result) {
     ServiceContext::Target target;
     ub4 cache = 0;
     Status status = FindTarget(environment, request, mode, target, cache);
     if (status.Failed()) return status;
-    const Made<ServiceContext> made(Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0));
+    Made<ServiceContext> made(Create<ServiceContext>(environment, OCI_HTYPE_SVCCTX, 0));
     status = made->LogOn(target, request.credentials, ServiceContext::EndedBy::release);
     if (status.Failed()) return status;
     made->statement_cache_size = cache;
     ShowTag(*made, request.wish.tag, result);
-    *result.service = AsHandle<OCISvcCtx>(const_cast<Made<ServiceContext>&>(made).release());
+    *result.service = AsHandle<OCISvcCtx>(made.release());
     return status;
 }
 

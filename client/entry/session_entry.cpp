@@ -21,9 +21,10 @@ Status CheckLogonMode(ub4 mode) {
     return {};
 }
 
-// What the context is to be attached to: a database, or a pool of that name. `cache` is set to the pool's cache size.
-Status FindTarget(const Environment& environment, std::string_view name, ub4 mode, ServiceContext::Target& target,
-                  ub4& cache) {
+// What the context is to be attached to: a database, or a pool of that name. `cache` is set to the pool's cache size;
+// where no user is named it is the pool's own.
+Status FindTarget(const Environment& environment, std::string_view name, ub4 mode, engine::Credentials& credentials,
+                  ServiceContext::Target& target, ub4& cache) {
     if (mode & OCI_LOGON2_STMTCACHE) cache = ServiceContext::kDefaultCacheSize;
     if (!(mode & (OCI_LOGON2_CPOOL | OCI_LOGON2_SPOOL))) {
         target.database = name;
@@ -34,6 +35,7 @@ Status FindTarget(const Environment& environment, std::string_view name, ub4 mod
     Status status = FindPool(environment, kind, name, pool);
     if (status.Failed()) return status;
     if (const ub4 size = pool->Settings().cache_size) cache = size;
+    if (credentials.external) credentials = pool->Plan().own;
     target.source = std::make_shared<PoolSource>(std::move(pool), SessionWish());
     return status;
 }
@@ -59,7 +61,7 @@ Status LogOn(Environment& environment, OCISvcCtx** out, const LogonTexts& texts,
     if (status.Ok()) status = ReadDatabase(environment, texts.database, texts.database_length, database);
     ServiceContext::Target target;
     ub4 cache = 0;
-    if (status.Ok()) status = FindTarget(environment, database, mode, target, cache);
+    if (status.Ok()) status = FindTarget(environment, database, mode, credentials, target, cache);
     if (status.Failed()) return status;
 
     auto* service = Live<ServiceContext>(*out);

@@ -172,7 +172,7 @@ Status Pool::Fill() {
 // ---- Taking
 
 const engine::Credentials& Pool::WhoBegins(const engine::Credentials& named) const {
-    return plan_.one_user || (named.external && named.user.empty()) ? plan_.own : named;
+    return plan_.one_user ? plan_.own : named;
 }
 
 // Of those that the user may have, from the last one back: one of the tag, else one without a tag, else any, as far as
@@ -213,7 +213,7 @@ Status Pool::TakeOrReserve(const engine::Credentials& credentials, const Session
     } else {
         if (Total() >= size_.most && !resting_.empty()) gone.splice(gone.end(), resting_, resting_.begin());
         const std::uint32_t room = size_.most - std::min(size_.most, Total());
-        const bool own = &credentials == &plan_.own;
+        const bool own = credentials == plan_.own;
         to_open = std::max(1U, own ? std::min(room, size_.step) : 1U);
         opening_ += to_open;
     }

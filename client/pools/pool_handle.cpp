@@ -39,6 +39,7 @@ constexpr PoolNumbers kSessionPoolNumbers = {
 
 struct Named {
     const Environment* environment;
+    Kind kind;
     std::shared_ptr<Pool> pool;
 };
 using Names = std::map<std::string, Named, std::less<>>;
@@ -51,11 +52,11 @@ Names& AllNames() {
 }
 
 // "SPOOL_1": the kind, and a number of its own.
-std::string NewName(const Environment& environment, const std::shared_ptr<Pool>& pool, const char* kind) {
+std::string NewName(const Environment& environment, Kind kind, const std::shared_ptr<Pool>& pool) {
     static std::atomic<std::uint64_t> last{0};
-    std::string name = kind + std::to_string(++last);
+    std::string name = (kind == Kind::session_pool ? "SPOOL_" : "CPOOL_") + std::to_string(++last);
     const std::lock_guard lock(names_mutex);
-    AllNames().emplace(name, Named{&environment, pool});
+    AllNames().emplace(name, Named{&environment, kind, pool});
     return name;
 }
 
@@ -69,13 +70,11 @@ void Forget(const std::string& name) noexcept {
 }  // namespace
 
 Status FindPool(const Environment& environment, Kind kind, std::string_view name, std::shared_ptr<Pool>& pool) {
-    const PoolNumbers& numbers = kind == Kind::session_pool ? kSessionPoolNumbers : kConnectionPoolNumbers;
     const std::lock_guard lock(names_mutex);
     const Names& names = AllNames();
     const auto found = names.find(name);
-    if (found == names.end() || found->second.environment != &environment ||
-        found->second.pool->Plan().gone != numbers.none_of_that_name)
-        return Error(numbers.none_of_that_name);
+    if (found == names.end() || found->second.environment != &environment || found->second.kind != kind)
+        return Error(kind == Kind::session_pool ? errors::kNoSessionPool : errors::kNoConnectionPool);
     pool = found->second.pool;
     return {};
 }
@@ -153,7 +152,8 @@ Status PoolHandle::CreatePool(Request request) {
     if (fill) status = creation.pool->Fill();
     const bool bad_user = status.Number() == errors::kBadLogon || status.Number() == errors::kNoPassword;
     if (status.Failed()) return bad_user && numbers_.bad_user ? Error(numbers_.bad_user, status.Detail()) : status;
-    creation.name = NewName(Env(), creation.pool, Type() == OCI_HTYPE_SPOOL ? "SPOOL_" : "CPOOL_");
+    creation.name =
+        NewName(Env(), Type() == OCI_HTYPE_SPOOL ? Kind::session_pool : Kind::connection_pool, creation.pool);
     std::string converted;
     shown_name_ = TextOut(Env(), creation.name, converted);
     if (caches && settings_->cache_size == 0) settings_->cache_size = kDefaultCacheSize;

@@ -31,7 +31,8 @@ private:
 // Somebody who holds queries or other things of the connection: told before it goes.
 class LinkUser {
 public:
-    // Drop what was made from the connection; the link is left afterwards. May not throw.
+    // Drop what was made from the connection, but for what rests in the statement cache; the link is left afterwards.
+    // May not throw.
     virtual void LinkClosed() noexcept = 0;
     // The same when the session goes on with another connection.
     virtual void ConnectionChanged() noexcept { LinkClosed(); }

@@ -26,7 +26,7 @@ public:
     virtual ~ConnectionSource() = default;
     [[nodiscard]] virtual const std::shared_ptr<engine::Database>& GetDatabase() const = 0;
     [[nodiscard]] virtual const std::string& DatabaseName() const = 0;
-    // A connection of that user's, or the pool's own where none is named. `connected` is set unless the call fails.
+    // A connection of that user's. `connected` is set unless the call fails.
     virtual Status Take(const engine::Credentials& credentials, Connected& connected) = 0;
 };
 

@@ -32,8 +32,9 @@ const std::shared_ptr<StatementShare>& Statement::Share() {
     return share_;
 }
 
-// What is open and compiled goes before the link does.
+// What is open and compiled goes before the link does. One that rests in the cache goes, or stays, with the connection.
 void Statement::LinkClosed() noexcept {
+    if (kept_in) return;
     Drop();
     run_.fetch_error = errors::kNotConnected;
 }

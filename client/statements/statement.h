@@ -93,7 +93,7 @@ public:
     std::string cache_key;
     // What holds between release and the next prepare2: no open rows, no pieces in progress, no counts.
     void Rest() noexcept;
-    void Join(const std::shared_ptr<Link>& link) { Use(link); }    // null: leaves, keeping what is compiled
+    void Join(const std::shared_ptr<Link>& link) { Use(link); }
     [[nodiscard]] StatementCache* Cache() const;    // of the session; null when it is off
 
     // Attributes that are only kept.

@@ -62,7 +62,6 @@ void StatementCache::Keep(Statement& statement, std::string_view key) {
     if (Statement* before = key.empty() ? TakeByText(statement.Text()) : TakeByKey(key)) Destroy(before);
     statement.Rest();
     live::Retype(&statement, Kind::none);
-    statement.Join(nullptr);
     statement.kept_in = this;
     kept_.push_back(&statement);
     if (kept_.size() > capacity_) Drop(0);

@@ -2,6 +2,7 @@
 #include <cstring>
 #include <filesystem>
 #include <thread>
+#include <vector>
 
 #include "faults/scenarios.h"
 
@@ -269,6 +270,44 @@ void ErrorsWithWords(World& w) {
     w.See(text.find(kName) != std::string::npos ? "named" : text);
 }
 
+// Pools lose no session, whatever fails: those that were got are given back at the end, and then none is in use.
+void PoolSessions(World& w) {
+    auto* pool = w.New<OCISPool>(OCI_HTYPE_SPOOL);
+    static std::vector<OCISvcCtx*> held;
+    OraText* name = nullptr;
+    ub4 length = 0;
+    w.AtEnd([&w, pool] {
+        for (; !held.empty(); held.pop_back()) OCISessionRelease(held.back(), w.err, nullptr, 0, OCI_DEFAULT);
+        ub4 busy = 9;
+        EXPECT_EQ(OCIAttrGet(pool, OCI_HTYPE_SPOOL, &busy, nullptr, OCI_ATTR_SPOOL_BUSY_COUNT, w.err), OCI_SUCCESS);
+        EXPECT_EQ(busy, 0u);
+        const sword code = OCISessionPoolDestroy(pool, w.err, OCI_DEFAULT);
+        EXPECT_TRUE(code == OCI_SUCCESS || World::Number(w.err, OCI_HTYPE_ERROR) == 24404);
+        return OCI_SUCCESS;
+    });
+    // Memory for one session but not for the other is a warning.
+    w.Step("OCISessionPoolCreate", [&] {
+        return OCISessionPoolCreate(w.env, w.err, pool, &name, &length, World::Text(":memory:"), 8, 2, 4, 2, nullptr, 0,
+                                    nullptr, 0, OCI_SPC_HOMOGENEOUS | OCI_SPC_STMTCACHE);
+    });
+    constexpr char kTag[] = "a tag that is longer than a short string";
+    for (const char* tag : {"", kTag, ""}) {
+        OCISvcCtx* svc = nullptr;
+        w.Step("OCISessionGet", [&] {
+            return OCISessionGet(w.env, w.err, &svc, nullptr, name, length, World::Text(tag), World::Size(tag), nullptr,
+                                 nullptr, nullptr, OCI_SESSGET_SPOOL);
+        });
+        held.push_back(svc);
+    }
+    w.Step("OCISessionRelease", [&] {
+        return OCISessionRelease(held.back(), w.err, World::Text(kTag), sizeof kTag - 1, OCI_SESSRLS_RETAG);
+    });
+    held.pop_back();
+    w.Surely("OCISessionRelease", [&] { return OCISessionRelease(held.back(), w.err, nullptr, 0, OCI_DEFAULT); });
+    held.pop_back();
+    w.See(w.Attribute<ub4>(OCI_ATTR_SPOOL_BUSY_COUNT, pool, OCI_HTYPE_SPOOL));
+}
+
 constexpr Scenario kScenarios[] = {
     {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;", OCI_DEFAULT, true},
     {"FromNothingThreaded", Ground::nothing, nullptr, FromNothing, "abc;", OCI_THREADED | OCI_OBJECT},
@@ -280,6 +319,7 @@ constexpr Scenario kScenarios[] = {
     {"SystemUser", Ground::environment, Account, SystemUser, "in;"},
     {"PasswordChange", Ground::environment, Account, PasswordChange, "changed;"},
     {"LogoffCommits", Ground::environment, nullptr, LogoffCommits, "1;"},
+    {"PoolSessions", Ground::environment, nullptr, PoolSessions, "1;"},
     {"ErrorsWithWords", Ground::environment, nullptr, ErrorsWithWords, "30152;named;"},
     {"ErrorTexts", Ground::session, nullptr, ErrorTexts, "942;named;"},
 };

@@ -1,0 +1,362 @@
+// Pools: who gets which session, what a full pool answers, what ends do, and many threads at once. Refusals that a
+// script shows stand in transcripts/pools.
+#include <atomic>
+#include <chrono>
+#include <mutex>
+#include <thread>
+
+#include "support/at_once.h"
+#include "support/call_fixture.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+
+constexpr ub4 kSpool = OCI_SESSGET_SPOOL;
+constexpr ub4 kHomogeneous = OCI_SPC_HOMOGENEOUS;
+
+class Pools : public CallFixture {
+protected:
+    Pools() : CallFixture(OCI_THREADED) {}
+    void SetUp() override {
+        CallFixture::SetUp();
+        Folder();
+        pool_ = New<OCISPool>(OCI_HTYPE_SPOOL);
+    }
+
+    sb4 Create(ub4 least, ub4 most, ub4 step, ub4 mode = kHomogeneous, const char* user = "ann",
+               const char* password = "secret") {
+        OraText* name = nullptr;
+        ub4 length = 0;
+        const sword code = OCISessionPoolCreate(env_, err_, pool_, &name, &length, Text("work"), 4, least, most, step,
+                                                Text(user), Length(user), Text(password), Length(password), mode);
+        if (code == OCI_SUCCESS) name_.assign(reinterpret_cast<char*>(name), length);
+        return Answer(code);
+    }
+    sb4 Get(OCISvcCtx** svc, OCIError* err, ub4 mode = kSpool, const char* tag = nullptr, OCIAuthInfo* auth = nullptr) {
+        OraText* came = nullptr;
+        ub4 length = 0;
+        const sword code = OCISessionGet(env_, err, svc, auth, Text(name_), static_cast<ub4>(name_.size()), Text(tag),
+                                         Length(tag), &came, &length, &found_, mode);
+        tag_.assign(came ? reinterpret_cast<char*>(came) : "", length);
+        return code == OCI_SUCCESS_WITH_INFO ? FirstCode(err) : Answer(code, err);
+    }
+    // For threads.
+    sb4 GetPlain(OCISvcCtx** svc, OCIError* err, std::string_view name) const {
+        return Answer(OCISessionGet(env_, err, svc, nullptr, Text(name), static_cast<ub4>(name.size()), nullptr, 0,
+                                    nullptr, nullptr, nullptr, kSpool), err);
+    }
+    sb4 Release(OCISvcCtx* svc, ub4 mode = OCI_DEFAULT, const char* tag = nullptr) {
+        return Answer(OCISessionRelease(svc, err_, Text(tag), Length(tag), mode));
+    }
+    sb4 Destroy(ub4 mode = OCI_DEFAULT) { return Answer(OCISessionPoolDestroy(pool_, err_, mode)); }
+    ub4 OpenCount() { return Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_OPEN_COUNT); }
+    ub4 Busy() { return Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_BUSY_COUNT); }
+    template <class T>
+    sb4 Set(ub4 attribute, T value) {
+        return Answer(OCIAttrSet(pool_, OCI_HTYPE_SPOOL, &value, 0, attribute, err_));
+    }
+    sb4 Run(OCISvcCtx* svc, const char* sql) const {
+        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        sb4 answer = Answer(OCIStmtPrepare(stmt, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT));
+        if (answer == 0) answer = Answer(OCIStmtExecute(svc, stmt, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
+        OCIHandleFree(stmt, OCI_HTYPE_STMT);
+        return answer;
+    }
+    OCIAuthInfo* User(const char* user, const char* password) {
+        auto* auth = New<OCIAuthInfo>(OCI_HTYPE_AUTHINFO);
+        for (const auto& [text, attribute] : {std::pair(user, OCI_ATTR_USERNAME), std::pair(password, OCI_ATTR_PASSWORD)})
+            EXPECT_EQ(Answer(OCIAttrSet(auth, OCI_HTYPE_AUTHINFO, Text(text), Length(text), attribute, err_)), 0);
+        return auth;
+    }
+    OCISPool* pool_ = nullptr;
+    std::string name_;
+    std::string tag_;
+    boolean found_ = FALSE;
+};
+
+TEST_F(Pools, NumbersOfAPool) {
+    const struct { ub4 least, most, step; sb4 answer; } cases[] = {
+        {0, 0, 0, 24413}, {2, 1, 1, 24413}, {0, 2, 0, 24413}, {1, 0, 1, 24413}, {2, 2, 0, 0}, {0, 1, 5, 0}};
+    for (const auto& c : cases) {
+        EXPECT_EQ(Create(c.least, c.most, c.step), c.answer) << c.least << ' ' << c.most << ' ' << c.step;
+        if (c.answer != 0) continue;
+        EXPECT_EQ(OpenCount(), c.least);
+        EXPECT_EQ(Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_MAX), c.most);
+        EXPECT_EQ(Destroy(), 0);
+    }
+    EXPECT_EQ(Create(0, 1, 1, 0x10), 24393);
+    EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "", "secret"), 24415);
+    EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "ann", "wrong"), 1017);
+    EXPECT_EQ(Destroy(), 24404);
+    // Steps, a surplus that goes as it comes back, and a pool that shrinks and grows.
+    ASSERT_EQ(Create(1, 4, 2), 0);
+    OCISvcCtx* svc[4] = {};
+    const ub4 open[] = {1, 3, 3, 4};
+    for (int index = 0; index < 4; ++index) {
+        ASSERT_EQ(Get(&svc[index], err_), 0);
+        EXPECT_EQ(OpenCount(), open[index]) << index;
+    }
+    EXPECT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
+    EXPECT_EQ(Release(svc[0]), 0);
+    EXPECT_EQ(Release(svc[1]), 0);
+    EXPECT_EQ(OpenCount(), 2u);
+    EXPECT_EQ(Create(3, 3, 0, OCI_SPC_REINITIALIZE), 0);
+    EXPECT_EQ(OpenCount(), 3u);
+    EXPECT_EQ(Destroy(2), 24394);
+    EXPECT_EQ(Destroy(), 24422);
+    EXPECT_EQ(OCIHandleFree(pool_, OCI_HTYPE_SPOOL), OCI_ERROR);
+    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24386);
+    EXPECT_EQ(Release(svc[2]), 0);
+    EXPECT_EQ(OCIHandleFree(svc[3], OCI_HTYPE_SVCCTX), OCI_SUCCESS);
+    EXPECT_EQ(OpenCount(), 2u) << "the freed context's is closed";
+    EXPECT_EQ(OCIHandleFree(pool_, OCI_HTYPE_SPOOL), OCI_SUCCESS) << "destroys what is not in use";
+}
+
+TEST_F(Pools, ModesThatAreRefused) {
+    ASSERT_EQ(Create(0, 1, 1), 0);
+    const struct { ub4 mode; sb4 answer; } cases[] = {
+        {kSpool | OCI_SESSGET_CPOOL, 24300}, {OCI_SESSGET_SPOOL_MATCHANY, 24300}, {0x1000, 24300},
+        {kSpool | OCI_SESSGET_PURITY_NEW | OCI_SESSGET_PURITY_SELF, 24300}, {kSpool | OCI_SESSGET_CREDPROXY, 24419},
+        {kSpool | OCI_SESSGET_SYSDBA, 24300}, {OCI_SESSGET_SYSDBA, 1031}, {OCI_SESSGET_CPOOL, 24392},
+        {kSpool | OCI_SESSGET_CREDEXT, 24300}};
+    OCISvcCtx* svc = nullptr;
+    for (const auto& c : cases) EXPECT_EQ(Get(&svc, err_, c.mode), c.answer) << c.mode;
+    EXPECT_EQ(svc, nullptr);
+    EXPECT_EQ(Get(nullptr, err_), 21560);
+    EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, Bogus<OCIAuthInfo>()), OCI_INVALID_HANDLE);
+    ASSERT_EQ(Get(&svc, err_), 0);
+    EXPECT_EQ(Release(svc, 4), 24300);
+    OCISession* session = Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
+    OCIServer* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
+    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 24420);
+    EXPECT_EQ(Answer(OCIServerDetach(server, err_, 0)), 24420);
+    EXPECT_EQ(LogOn(&svc, "work"), 24420) << "a logon would log it off first";
+    EXPECT_EQ(Release(svc), 0);
+}
+
+TEST_F(Pools, WhichSessionComes) {
+    ASSERT_EQ(Create(0, 3, 1), 0);
+    const auto come_and_go = [&](const char* tag, ub4 mode, const char* retag) {
+        OCISvcCtx* svc = nullptr;
+        EXPECT_EQ(Get(&svc, err_, kSpool | mode, tag), 0);
+        const std::string came = (found_ ? "found " : "") + tag_;
+        EXPECT_EQ(Release(svc, retag ? OCI_SESSRLS_RETAG : OCI_DEFAULT, retag), 0);
+        return came + '/' + std::to_string(OpenCount());
+    };
+    const struct { const char* tag; ub4 mode; const char* retag; const char* came; } cases[] = {
+        {nullptr, 0, "a", "found /1"}, {"a", 0, nullptr, "found a/1"}, {nullptr, 0, nullptr, "found /2"},
+        {"b", 0, "b", "/2"}, {"b", 0, nullptr, "found b/2"},
+        {"c", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "b/2"}, {"c", 0, "c", "/3"},
+        // None without a tag is left: the one that rests longest makes room.
+        {"d", 0, "d", "/3"}, {"a", 0, "", "/3"}, {"b", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "/3"},
+        {nullptr, OCI_SESSGET_PURITY_NEW, nullptr, "found /3"}};
+    int line = 0;
+    for (const auto& c : cases) EXPECT_EQ(come_and_go(c.tag, c.mode, c.retag), c.came) << line++;
+}
+
+TEST_F(Pools, SessionsOfSeveralUsers) {
+    ASSERT_EQ(Create(2, 2, 0, OCI_DEFAULT), 0);
+    EXPECT_EQ(OpenCount(), 0u);
+    OCISvcCtx *svc = nullptr, *other = nullptr;
+    ASSERT_EQ(Get(&svc, err_), 0) << "of the pool's own user, who becomes the database's owner";
+    ASSERT_EQ(Release(svc), 0);
+    EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, User("ann", "wrong")), 1017) << "one of hers rests, but not for him";
+    ASSERT_EQ(Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT), 0);
+    ASSERT_EQ(Get(&other, err_, kSpool, nullptr, User("ann", "secret")), 0);
+    EXPECT_EQ(OpenCount(), 2u);
+    ASSERT_EQ(Release(svc), 0);
+    ASSERT_EQ(Get(&svc, err_, kSpool, nullptr, User("ann", "secret")), 0) << "the system user's makes room";
+    EXPECT_EQ(OpenCount(), 2u);
+    ASSERT_EQ(Release(svc), 0);
+    ASSERT_EQ(Release(other), 0);
+}
+
+TEST_F(Pools, WhatAFullPoolAnswers) {
+    ASSERT_EQ(Create(0, 1, 1), 0);
+    OCISvcCtx *svc = nullptr, *second = nullptr;
+    ASSERT_EQ(Get(&svc, err_), 0);
+    EXPECT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, 4), 24328);
+    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_NOWAIT), 0);
+    EXPECT_EQ(Get(&second, err_), 24418);
+    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT), 0);
+    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20), 0);
+    EXPECT_EQ(Get(&second, err_), 24496);
+    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_FORCEGET), 0);
+    EXPECT_EQ(Get(&second, err_), 24417);
+    EXPECT_EQ(OpenCount(), 2u);
+    EXPECT_EQ(Release(second), 0);
+    EXPECT_EQ(OpenCount(), 1u);
+    // The idle go when somebody looks, down to the least.
+    ASSERT_EQ(Release(svc), 0);
+    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1), 0);
+    EXPECT_EQ(OpenCount(), 1u);
+    std::this_thread::sleep_for(1100ms);
+    EXPECT_EQ(OpenCount(), 0u);
+}
+
+// Release and logoff commit; what is taken away rolls back; nothing of a former session reaches the next.
+TEST_F(Pools, WhatASessionLeaves) {
+    ASSERT_EQ(Create(0, 1, 1, kHomogeneous | OCI_SPC_STMTCACHE), 0);
+    OCISvcCtx* svc = nullptr;
+    OCIStmt *stmt = nullptr, *again = nullptr;
+    const auto prepare = [&](OCIStmt** place) {
+        return Answer(OCIStmtPrepare2(svc, place, err_, Text("select n from t"), 15, nullptr, 0, OCI_NTV_SYNTAX, 0));
+    };
+    ASSERT_EQ(Get(&svc, err_), 0);
+    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
+    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
+    ASSERT_EQ(Run(svc, "insert into t values(1)"), 0);
+    ASSERT_EQ(prepare(&stmt), 0);
+    ASSERT_EQ(Answer(OCIStmtExecute(svc, stmt, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), 0);
+    ASSERT_EQ(prepare(&again), 0);
+    EXPECT_EQ(again, stmt);
+    ASSERT_EQ(Answer(OCIStmtRelease(again, err_, nullptr, 0, OCI_DEFAULT)), 0);
+    ASSERT_EQ(Answer(OCIBreak(svc, err_)), 0);
+    ASSERT_EQ(Release(svc), 0);
+
+    ASSERT_EQ(Get(&svc, err_), 0);
+    ASSERT_EQ(prepare(&again), 0);
+    EXPECT_EQ(again, stmt) << "the cache stays with the connection";
+    EXPECT_EQ(Answer(OCIStmtExecute(svc, again, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0) << "1013 is not its";
+    ASSERT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 24374);
+    ASSERT_EQ(Run(svc, "insert into t values(2)"), 0);
+    ASSERT_EQ(Release(svc), 0);
+    EXPECT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 3114) << "its session is over";
+
+    ASSERT_EQ(Get(&svc, err_), 0);
+    EXPECT_EQ(Run(svc, "create unique index i on t(n)"), 0);
+    EXPECT_EQ(Run(svc, "insert into t values(2)"), 1) << "the release has committed";
+    ASSERT_EQ(Run(svc, "insert into t values(3)"), 0);
+    EXPECT_EQ(Destroy(OCI_SPD_FORCE), 0);
+    EXPECT_EQ(Run(svc, "insert into t values(4)"), 1012);
+    EXPECT_EQ(Release(svc), 1012);
+    EXPECT_EQ(Release(svc), OCI_INVALID_HANDLE) << "the context has gone all the same";
+    ASSERT_EQ(Create(1, 1, 1), 0) << "the handle serves anew";
+    ASSERT_EQ(Get(&svc, err_), 0);
+    EXPECT_EQ(Run(svc, "insert into t values(3)"), 0) << "force has rolled back";
+    ASSERT_EQ(Release(svc, OCI_SESSRLS_DROPSESS), 0);
+    EXPECT_EQ(OpenCount(), 0u);
+}
+
+TEST_F(Pools, AServerAttachedToAConnectionPool) {
+    auto* pool = New<OCICPool>(OCI_HTYPE_CPOOL);
+    OraText* name = nullptr;
+    sb4 length = 0;
+    const auto create = [&](const char* database, const char* password, ub4 mode) {
+        return Answer(OCIConnectionPoolCreate(env_, err_, pool, &name, &length, Text(database),
+                                              static_cast<sb4>(Length(database)), 1, 1, 1, Text("ann"), 3,
+                                              Text(password), 6, mode));
+    };
+    EXPECT_EQ(create("/nowhere/x.db", "secret", 0), 24400);
+    EXPECT_EQ(create("work", "secret", 1), 24393);
+    EXPECT_EQ(create("work", "secret", OCI_CPOOL_REINITIALIZE), 24395);
+    ASSERT_EQ(create("work", "secret", 0), 0);
+    EXPECT_EQ(create("work", "secret", 0), 24407);
+    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+    ASSERT_EQ(Answer(OCIServerAttach(server, err_, name, length, OCI_CPOOL)), 0);
+    auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+    ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
+    OCISession* sessions[] = {User("ann", "secret"), User("ann", "secret")};
+    ub1 no_wait = 1;
+    ASSERT_EQ(Answer(OCIAttrSet(pool, OCI_HTYPE_CPOOL, &no_wait, 0, OCI_ATTR_CONN_NOWAIT, err_)), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[0], OCI_CRED_RDBMS, 0)), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[1], OCI_CRED_RDBMS, 0)), 24401);
+    const auto counts = [&] {
+        return Attribute<ub4>(pool, OCI_HTYPE_CPOOL, OCI_ATTR_CONN_OPEN_COUNT) * 10 +
+               Attribute<ub4>(pool, OCI_HTYPE_CPOOL, OCI_ATTR_CONN_BUSY_COUNT);
+    };
+    EXPECT_EQ(counts(), 11u);
+    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, sessions[0], 0)), 0);
+    EXPECT_EQ(counts(), 10u);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[1], OCI_CRED_RDBMS, 0)), 0);
+    EXPECT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
+    EXPECT_EQ(counts(), 0u) << "a detach closes";
+    EXPECT_EQ(Answer(OCIConnectionPoolDestroy(pool, err_, 1)), 24394);
+    EXPECT_EQ(Answer(OCIConnectionPoolDestroy(pool, err_, 0)), 0);
+}
+
+TEST_F(Pools, ManyThreadsShareAFewSessions) {
+    ASSERT_EQ(Create(1, 3, 1), 0);
+    std::atomic<int> in_use = 0, failures = 0;
+    AtOnce(8, [&](int index) {
+        auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+        for (int round = 0; round < 60; ++round) {
+            OCISvcCtx* svc = nullptr;
+            failures += GetPlain(&svc, err, name_) != 0;
+            failures += ++in_use > 3;
+            failures += OCIPing(svc, err, OCI_DEFAULT) != OCI_SUCCESS;
+            --in_use;
+            failures += OCISessionRelease(svc, err, nullptr, 0, round % 16 == index ? OCI_SESSRLS_DROPSESS : 0) != 0;
+        }
+    });
+    EXPECT_EQ(failures, 0);
+    EXPECT_EQ(Busy(), 0u);
+    EXPECT_LE(OpenCount(), 3u);
+    EXPECT_EQ(Destroy(), 0);
+}
+
+// However a pool ends, nobody waits in it for ever, and what was in use is given up without harm.
+TEST_F(Pools, WhoWaitsIsToldWhenThePoolGoes) {
+    for (const bool freed : {false, true}) {
+        ASSERT_EQ(Create(1, 1, 1), 0);
+        OCISvcCtx* svc = nullptr;
+        ASSERT_EQ(Get(&svc, err_), 0);
+        std::atomic<int> waiting = 0;
+        AtOnce(4, [&](int index) {
+            auto* err = NewHandle<OCIError>(env_, OCI_HTYPE_ERROR);
+            OCISvcCtx* own = nullptr;
+            if (index > 0) {
+                ++waiting;
+                const sb4 answer = GetPlain(&own, err, name_);
+                EXPECT_TRUE(freed || answer == 24416) << answer;
+                EXPECT_EQ(own, nullptr);
+                return;
+            }
+            while (waiting < 3) std::this_thread::yield();
+            std::this_thread::sleep_for(30ms);
+            if (freed) {
+                EXPECT_EQ(OCIHandleFree(env_, OCI_HTYPE_ENV), OCI_SUCCESS);
+                return;
+            }
+            EXPECT_EQ(Answer(OCISessionPoolDestroy(pool_, err, OCI_SPD_FORCE), err), 0);
+        });
+        EXPECT_TRUE(freed || Release(svc) == 1012);
+    }
+    Open(OCI_THREADED);
+}
+
+TEST_F(Pools, DestroyedAndMadeAnewUnderLoad) {
+    std::atomic<bool> done = false;
+    std::atomic<int> odd = 0;
+    std::mutex naming;
+    ASSERT_EQ(Create(1, 2, 1), 0);
+    AtOnce(5, [&](int index) {
+        auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+        for (int round = 0; index == 0 && round < 15; ++round) {
+            odd += Destroy(OCI_SPD_FORCE) != 0;
+            const std::lock_guard lock(naming);
+            odd += Create(1, 2, 1) != 0;
+        }
+        if (index == 0) done = true;
+        while (!done) {
+            std::string name;
+            {
+                const std::lock_guard lock(naming);
+                name = name_;
+            }
+            OCISvcCtx* svc = nullptr;
+            const sb4 got = GetPlain(&svc, err, name);
+            odd += got != 0 && got != 24416 && got != 3114;
+            if (got != 0) continue;
+            (void)OCIPing(svc, err, OCI_DEFAULT);
+            const sb4 released = Answer(OCISessionRelease(svc, err, nullptr, 0, 0), err);
+            odd += released != 0 && released != 1012;
+        }
+    });
+    EXPECT_EQ(odd, 0);
+    EXPECT_EQ(Busy(), 0u);
+}
+
+}  // namespace
