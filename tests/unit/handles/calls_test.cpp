@@ -381,6 +381,11 @@ TEST_F(CallsTest, VersionsAreCutToTheBuffer) {
     ASSERT_EQ(Answer(OCIServerVersion(svc, err_, text, 8, OCI_HTYPE_SVCCTX)), 0);
     EXPECT_EQ(reinterpret_cast<char*>(text), whole.substr(0, 7));
     EXPECT_EQ(OCIServerVersion(svc, err_, text, 8, OCI_HTYPE_SERVER), OCI_INVALID_HANDLE);
+    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+    EXPECT_EQ(Answer(OCIServerVersion(server, err_, text, 8, OCI_HTYPE_SERVER)), 3114);
+    ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text(":memory:"), 8, 0)), 0);
+    ASSERT_EQ(Answer(OCIServerVersion(server, err_, text, sizeof text, OCI_HTYPE_SERVER)), 0);
+    EXPECT_EQ(reinterpret_cast<char*>(text), whole);
     sword major = -1;
     sword port = -1;
     OCIClientVersion(&major, nullptr, nullptr, nullptr, &port);

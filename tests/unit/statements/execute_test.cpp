@@ -48,6 +48,7 @@ TEST_F(Executing, WhatIsWrongWithTheCall) {
     const struct { const char* sql; ub4 iterations, first, mode; sb4 answer; } cases[] = {
         {"insert into t values(1)", 0, 0, OCI_DEFAULT, 24333}, {"insert into t values(1)", 2, 2, OCI_DEFAULT, 24333},
         {"insert into t values(1)", 1, 3, OCI_DEFAULT, 24333}, {"insert into t values(1)", 1, 0, 0x1000, 24300},
+        {"begin null; end;", 1, 1, OCI_DEFAULT, 24333},
         {"insert into t values(1)", 1, 0, OCI_DESCRIBE_ONLY | OCI_PARSE_ONLY, 24380},
         {"insert into t values(:a)", 1, 0, OCI_DEFAULT, 1008},
         {"insert into t values(1) returning a into :b", 1, 0, OCI_DEFAULT, 1008}, {"create table u(a number)", 2, 0, OCI_DEFAULT, 24969},
