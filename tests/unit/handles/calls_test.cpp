@@ -321,6 +321,9 @@ TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0)), 24313);
     EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 1012) << "begun, but not set in the context";
     EXPECT_EQ(set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION, session), 0);
+    auto* transaction = New<OCITrans>(OCI_HTYPE_TRANS);
+    EXPECT_EQ(set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS, transaction), 0);
+    EXPECT_EQ(Attribute<OCITrans*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS), transaction);
     EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
     EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_ERROR) << "in use";
     EXPECT_EQ(Answer(OCIBreak(svc, err_)), 0);
