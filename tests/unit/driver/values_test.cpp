@@ -101,6 +101,15 @@ TEST(Values, NullSetsTheIndicatorOnly) {
     EXPECT_EQ(element.length, 0);
     EXPECT_EQ(element.Bytes(4), "\xEE\xEE\xEE\xEE");
     EXPECT_EQ(element.Show(), "\n");
+    element.return_code = 1405;
+    EXPECT_EQ(element.Assign("7", 1), "");
+    EXPECT_EQ(element.return_code, 0) << "of a value that was fetched before";
+}
+
+TEST(Values, ATextOfOneByteIsItsEnd) {
+    Element element(SQLT_STR, 1);
+    EXPECT_EQ(element.Assign("ab", 2), "");
+    EXPECT_EQ(element.Bytes(1), std::string(1, '\0'));
 }
 
 TEST(Values, WhatFollowsTheFrame) {
@@ -198,6 +207,11 @@ TEST(Values, FreeingABufferGivesBackEveryBlock) {
     EXPECT_EQ(PlatformOutstanding("harnix"), before);
     FreeBufferBlocks(buffer);
     EXPECT_EQ(PlatformOutstanding("harnix"), before) << "a second time there is nothing to free";
+    buffer.dynamic.lengths_count = 1;    // as a dynamic define leaves it
+    ASSERT_EQ(AllocateBuffer(buffer, nullptr, {.type = SQLT_STR, .size = 10}, 3), 0);
+    *buffer.Length(0) = 5;
+    EXPECT_EQ(LengthOf(buffer, 0), 5u) << "a buffer in its slot has none of it";
+    FreeBufferBlocks(buffer);
 }
 
 TEST(Values, ElementSizesByType) {

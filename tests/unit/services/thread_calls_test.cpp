@@ -24,25 +24,19 @@ protected:
         CallFixture::TearDown();
     }
 
-    OCIThreadMutex* NewMutex() {
-        OCIThreadMutex* mutex = nullptr;
-        EXPECT_EQ(OCIThreadMutexInit(env_, err_, &mutex), OCI_SUCCESS);
-        return mutex;
+    template <class T>
+    T* Made(sword (*init)(dvoid*, OCIError*, T**)) {
+        T* made = nullptr;
+        EXPECT_EQ(init(env_, err_, &made), OCI_SUCCESS);
+        return made;
     }
+    OCIThreadMutex* NewMutex() { return Made(OCIThreadMutexInit); }
+    OCIThreadId* NewId() { return Made(OCIThreadIdInit); }
+    OCIThreadHandle* NewHandle() { return Made(OCIThreadHndInit); }
     OCIThreadKey* NewKey(OCIThreadKeyDestFunc destroy = nullptr) {
         OCIThreadKey* key = nullptr;
         EXPECT_EQ(OCIThreadKeyInit(env_, err_, &key, destroy), OCI_SUCCESS);
         return key;
-    }
-    OCIThreadId* NewId() {
-        OCIThreadId* id = nullptr;
-        EXPECT_EQ(OCIThreadIdInit(env_, err_, &id), OCI_SUCCESS);
-        return id;
-    }
-    OCIThreadHandle* NewHandle() {
-        OCIThreadHandle* handle = nullptr;
-        EXPECT_EQ(OCIThreadHndInit(env_, err_, &handle), OCI_SUCCESS);
-        return handle;
     }
     boolean Same(OCIThreadId* left, OCIThreadId* right) {
         boolean same = 9;
