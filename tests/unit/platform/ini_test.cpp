@@ -76,6 +76,7 @@ TEST_F(Ini, AWriteChangesOneLine) {
         {"", "s", "k", "v", "[s]\nk=v\n"},
         {"; top\n[s]\nK  =  old\n; end\n", "S", "k", "new", "; top\n[s]\nK  =  new\n; end\n"},
         {"[s]\r\na=1\r\n\r\n[t]\r\nb=2", "s", "k", "v", "[s]\r\na=1\r\nk=v\r\n\r\n[t]\r\nb=2"},
+        {"[s]\r\na=1\n", "s", "k", "v", "[s]\r\na=1\nk=v\r\n"},
         {"[s]\r\na=1", "s", "k", "v", "[s]\r\na=1\r\nk=v\r\n"}, {"[s]\na=1\n", "t", "k", "v", "[s]\na=1\n\n[t]\nk=v\n"},
         {"[s]\n\n", "s", "k", "v", "[s]\nk=v\n\n"}, {"[s]\nk=1\nk=2\n", "s", "k", "3", "[s]\nk=3\nk=2\n"},
         {"[s]\nk=1\nodd line\nk=2\n[t]\nk=3\n", "s", "K", nullptr, "[s]\nodd line\n[t]\nk=3\n"},
