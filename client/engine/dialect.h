@@ -20,6 +20,7 @@ struct Dialect {
     std::string (*placeholder)(std::size_t number);    // from 1: ?1, $1
     std::span<const Spelling> types;         // replaced as whole words in definition statements and casts
     std::span<const Spelling> functions;     // replaced as whole words in expressions
+    std::span<const Spelling> calls = {};    // of functions: replaced where a parenthesis follows
     std::span<const Spelling> casts;         // type, function: "cast(e as T(a, b))" becomes "F(e, a, b)"
     std::string_view counts_characters;      // behind the name of a text type, or its cast, whose size is in characters:
                                              // varchar2(9 char); empty: every size is
@@ -27,9 +28,19 @@ struct Dialect {
     std::string_view minus;                  // between two queries, for "minus"
     std::string_view truncate_table;         // for "truncate table"
     bool cuts_for_update = false;            // "for update ..." is left out
-    std::string (*date_literal)(const date::DateTime& value) = nullptr;    // for date '...' and timestamp '...'
+    std::string (*date_literal)(const date::DateTime& value, bool is_date) = nullptr;    // date '...', timestamp '...'
     std::string (*row_id_literal)(const RowId& row) = nullptr;             // for a row id's text
     std::string_view row_id = {};            // for "rowid", a row's own column
+    std::string_view subquery_alias = {};    // behind a subquery of a from clause that has none; a number is added
+    std::string (*quoted_name)(std::string_view quoted) = nullptr;         // for a name in quotes, which stay
+    std::string (*bytes_literal)(std::string_view digits) = nullptr;       // for x'0AFF'
+    std::string_view empty_text = {};        // for '', which is a null
+    // decode(value, search, result, ..., otherwise): what stands before the value, behind it, between a search and its
+    // result, before a further search, before the otherwise, and at the end.
+    struct DecodeText {
+        std::string_view begin, first, then, next, otherwise, end;
+    };
+    const DecodeText* decode = nullptr;
 };
 
 }  // namespace engine

@@ -54,6 +54,10 @@ private:
         std::size_t as;      // of a cast that becomes a function: where the AS stands
         bool is_columns;     // the columns of a table's definition
         bool is_type_size;   // the size behind a type's name
+        std::size_t decoded = 0;      // of a decode: its argument that is visited, from 1
+        std::size_t arguments = 0;    // of a decode: all of them
+        bool is_from_subquery = false;    // a subquery of a from clause
+        bool in_from = false;         // what is visited stands in the from clause of its own
     };
 
     // Deals with the token, answers the index of the next one.
@@ -63,6 +67,9 @@ private:
         switch (token.kind) {
             case TokenKind::placeholder: return VisitPlaceholder(index);
             case TokenKind::literal: VisitLiteral(index); break;
+            case TokenKind::quoted_word:
+                if (dialect_.quoted_name && !defines_code_) Replace(token, token.End(), dialect_.quoted_name(token.text));
+                break;
             case TokenKind::q_literal: Replace(token, token.End(), PlainLiteral(token.text)); break;
             case TokenKind::symbol: VisitSymbol(index); break;
             case TokenKind::word: return VisitWord(index);
@@ -87,6 +94,7 @@ private:
     // A row id's text that is compared with one becomes the engine's number of the row.
     void VisitLiteral(std::size_t index) {
         const Token& token = tokens_[index];
+        if (token.text == "''" && !dialect_.empty_text.empty()) return Replace(token, token.End(), dialect_.empty_text);
         rowid::RowId value;
         if (!row_ids_[index] || !dialect_.row_id_literal) return;
         if (!rowid::FromText(token.text.substr(1, token.text.size() - 2), &value)) return;
@@ -96,19 +104,51 @@ private:
 
     void VisitSymbol(std::size_t index) {
         const Token& token = tokens_[index];
-        if (token.Is("(")) {
+        if (token.Is(",") && !open_.empty() && open_.back().decoded > 0) {
+            Replace(token, token.End(), DecodeComma(open_.back()));
+        } else if (token.Is("(")) {
             const bool columns = names_columns_ && open_.empty();
             const std::size_t as = index > 0 && !cast_as_.empty() ? cast_as_[index - 1] : 0;
-            open_.push_back({Previous(index).Is("cast"), as, columns, type_end_ == index});
+            open_.push_back({Previous(index).Is("cast"), as, columns, type_end_ == index, decode_begin_ == index, Arguments(index),
+                             IsFromSubquery(index)});
         } else if (token.Is(")")) {
+            if (!open_.empty() && open_.back().decoded > 0) Replace(token, token.End(), dialect_.decode->end);
+            if (!open_.empty() && open_.back().is_from_subquery && !FollowedByAlias(index)) {
+                Insert(token.End(), std::string(dialect_.subquery_alias) + std::to_string(++subqueries_));
+            }
             if (!open_.empty()) open_.pop_back();
         } else if (token.Is("*") && !open_.empty() && open_.back().is_type_size) {
             Replace(token, token.End(), "38");
         }
     }
 
+    // Whether the parenthesis at `index` opens a subquery of a from clause.
+    bool IsFromSubquery(std::size_t index) const {
+        const Token& next = At(tokens_, index + 1);
+        const Token& before = Previous(index);
+        const bool is_query = next.Is("select") || next.Is("with") || next.Is("values");
+        const bool is_place = before.Is("from") || before.Is("join") || before.Is(",");
+        return !dialect_.subquery_alias.empty() && is_query && is_place && (open_.empty() ? in_from_ : open_.back().in_from);
+    }
+
+    // From clauses begin and end with words.
+    void NoteClause(const Token& token) {
+        constexpr std::string_view kOthers[] = {"select", "where", "group", "order", "having", "union", "intersect",
+                                                "minus", "except", "limit", "set", "values"};
+        bool& in_from = open_.empty() ? in_from_ : open_.back().in_from;
+        if (token.Is("from")) in_from = true;
+        else if (in_from && std::any_of(std::begin(kOthers), std::end(kOthers), [&](auto word) { return token.Is(word); }))
+            in_from = false;
+    }
+
     std::size_t VisitWord(std::size_t index) {
         const Token& token = tokens_[index];
+        NoteClause(token);
+        const Token& literal = At(tokens_, index + 1);
+        if (token.Is("x") && dialect_.bytes_literal && literal.kind == TokenKind::literal && literal.begin == token.End()) {
+            Replace(token, literal.End(), dialect_.bytes_literal(literal.text.substr(1, literal.text.size() - 2)));
+            return index + 2;
+        }
         if (!open_.empty() && open_.back().as == index && index > 0) return VisitCastType(index);
         if (IsTypePlace(index)) return VisitType(index);
         const bool in_type_size = !open_.empty() && open_.back().is_type_size;
@@ -135,10 +175,39 @@ private:
             Replace(token, token.End(), function);
         } else if (IsDateLiteral(index)) {
             return VisitDateLiteral(index);
+        } else if (IsDecode(index)) {
+            decode_begin_ = index + 1;
+            Replace(token, tokens_[index + 1].End(), dialect_.decode->begin);
         } else if (const auto* spelling = FindFunction(index)) {
             Replace(token, token.End(), spelling->engine);
         }
         return index + 1;
+    }
+
+    bool IsDecode(std::size_t index) const {
+        return dialect_.decode && tokens_[index].Is("decode") && At(tokens_, index + 1).Is("(") &&
+               !Previous(index).Is(".") && !defines_code_ && Arguments(index + 1) > 2;
+    }
+
+    // How many arguments the parentheses at `index` hold, if they are a decode's.
+    std::size_t Arguments(std::size_t index) const {
+        if (!dialect_.decode || !Previous(index).Is("decode")) return 0;
+        std::size_t count = 1;
+        int depth = 0;
+        for (std::size_t at = index; tokens_[at].kind != TokenKind::end; ++at) {
+            if (tokens_[at].Is("(")) ++depth;
+            if (tokens_[at].Is(")") && --depth == 0) break;
+            count += depth == 1 && tokens_[at].Is(",");
+        }
+        return count;
+    }
+
+    // What stands between the arguments of a decode.
+    std::string_view DecodeComma(Open& decode) const {
+        const std::size_t before = decode.decoded++;    // the argument that ends
+        if (before == 1) return dialect_.decode->first;
+        if (before % 2 == 0) return dialect_.decode->then;
+        return before + 1 == decode.arguments ? dialect_.decode->otherwise : dialect_.decode->next;
     }
 
     // Notes each CAST whose type has a function to do it: the place of its AS, by the place of the word CAST.
@@ -292,16 +361,19 @@ private:
         const Token& literal = tokens_[index + 1];
         date::DateTime value;
         if (date::FromEngineText(literal.text.substr(1, literal.text.size() - 2), &value) != 0) return index + 2;
-        Replace(tokens_[index], literal.End(), dialect_.date_literal(value));
+        Replace(tokens_[index], literal.End(), dialect_.date_literal(value, tokens_[index].Is("date")));
         return index + 2;
     }
 
-    // A word of the dialect's list that stands alone: no name's part, no call, no alias.
+    // A word of the dialect's lists: one that stands alone, no name's part, no call, no alias; or a call.
     const engine::Dialect::Spelling* FindFunction(std::size_t index) const {
-        const auto found = std::find_if(dialect_.functions.begin(), dialect_.functions.end(),
-                                        [&](const auto& spelling) { return tokens_[index].Is(spelling.written); });
-        if (found == dialect_.functions.end() || defines_code_) return nullptr;
         const Token& next = tokens_[index + 1];
+        const bool is_call = next.Is("(");
+        const auto& list = is_call ? dialect_.calls : dialect_.functions;
+        const auto found = std::find_if(list.begin(), list.end(),
+                                        [&](const auto& spelling) { return tokens_[index].Is(spelling.written); });
+        if (found == list.end() || defines_code_) return nullptr;
+        if (is_call) return Previous(index).Is(".") ? nullptr : &*found;
         if (Previous(index).Is(".") || Previous(index).Is("as") || next.Is(".") || next.Is("(")) return nullptr;
         return &*found;
     }
@@ -347,6 +419,9 @@ private:
     std::vector<Open> open_;
     std::vector<std::size_t> cast_as_;    // by token; 0: no cast that becomes a function
     std::size_t type_end_ = std::string_view::npos;
+    bool in_from_ = false;
+    unsigned subqueries_ = 0;
+    std::size_t decode_begin_ = std::string_view::npos;    // the parenthesis of the decode at hand
     std::size_t default_end_ = std::string_view::npos;    // where a default's closing parenthesis comes
     std::size_t copied_ = 0;
     EngineText result_;

@@ -124,6 +124,7 @@ int MicrosecondsTo(std::int64_t microseconds, date::DateTime& value) noexcept {
 
 int MicrosecondsFrom(const date::DateTime& given, std::int64_t& microseconds) noexcept {
     date::DateTime value = given;
+    if (given.month == 0) return errors::kBadMonth;    // a time alone
     if (const int error = date::RoundFraction(given, 6, &value)) return error;
     const int year = value.year > 0 ? value.year : value.year + 1;
     const std::chrono::year_month_day date(std::chrono::year(year), std::chrono::month(value.month),

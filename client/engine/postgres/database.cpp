@@ -6,6 +6,7 @@
 #include "engine/postgres/connection.h"
 #include "engine/postgres/home.h"
 #include "engine/postgres/postgres.h"
+#include "engine/postgres/types.h"
 #include "handles/errors.h"
 
 namespace engine::postgres {
@@ -31,7 +32,7 @@ constexpr Dialect::Spelling kTypes[] = {
     {"clob", "text"},
     {"nclob", "text"},
     {"dbclob", "text"},
-    {"date", "timestamp(0)"},
+    {"date", "kelp.date"},
     {"rowid", "tid"},
     {"timestamp with local time zone", "timestamptz"},
     {"timestamp with time zone", "timestamptz"},
@@ -39,19 +40,30 @@ constexpr Dialect::Spelling kTypes[] = {
 
 // The moment of the statement; the server's own words mean that of the transaction.
 constexpr Dialect::Spelling kFunctions[] = {
-    {"sysdate", "date_trunc('second', statement_timestamp()::timestamp)::timestamp(0)"},
-    {"current_date", "date_trunc('second', statement_timestamp()::timestamp)::timestamp(0)"},
-    {"systimestamp", "statement_timestamp()"},
-    {"current_timestamp", "statement_timestamp()"},
-    {"localtimestamp", "statement_timestamp()::timestamp"},
+    {"sysdate", "kelp.sysdate()"},
+    {"current_date", "kelp.\"current_date\"()"},
+    {"systimestamp", "kelp.systimestamp()"},
+    {"current_timestamp", "kelp.\"current_timestamp\"()"},
+    {"localtimestamp", "kelp.\"localtimestamp\"()"},
 };
+
+constexpr Dialect::Spelling kCalls[] = {
+    {"nvl", "coalesce"},
+    {"greatest", "kelp.greatest_of"},
+    {"least", "kelp.least_of"},
+};
+
+// A value is asked for once; two nulls are the same.
+constexpr Dialect::DecodeText kDecode = {
+    "(with kelp_d(kelp_e) as (select ", ") select case when kelp_d.kelp_e is not distinct from ", " then ",
+    " when kelp_d.kelp_e is not distinct from ", " else ", " end from kelp_d)"};
 
 std::string Placeholder(std::size_t number) { return '$' + std::to_string(number); }
 
-std::string DateLiteral(const date::DateTime& value) {
+std::string DateLiteral(const date::DateTime& value, bool is_date) {
     char text[date::kMaxEngineText];
     const std::string written(text, date::ToEngineText(value, text));
-    return (value.has_zone ? "timestamptz '" : "timestamp '") + written + "'";
+    return (is_date ? "kelp.date '" : value.has_zone ? "timestamptz '" : "timestamp(6) '") + written + "'";
 }
 
 std::string RowIdLiteral(const RowId& row) {
@@ -59,6 +71,11 @@ std::string RowIdLiteral(const RowId& row) {
     TupleIdOf(row, bytes);
     return "'(" + std::to_string(Get<std::uint32_t>(bytes)) + "," + std::to_string(Get<std::uint16_t>(bytes + 4)) + ")'::tid";
 }
+
+// The application's names are in upper case where the server's are in lower case: in quotes each is the other's.
+std::string QuotedName(std::string_view quoted) { return ShownName(quoted); }
+
+std::string BytesLiteral(std::string_view digits) { return "'\\x" + std::string(digits) + "'::bytea"; }
 
 class PgDatabase final : public Database {
 public:
@@ -79,6 +96,7 @@ const Dialect& PgDatabase::GetDialect() const {
         .placeholder = Placeholder,
         .types = kTypes,
         .functions = kFunctions,
+        .calls = kCalls,
         .casts = {},
         .counts_characters = {},
         .dual = "(select 'X' as dummy)",
@@ -87,6 +105,11 @@ const Dialect& PgDatabase::GetDialect() const {
         .date_literal = DateLiteral,
         .row_id_literal = RowIdLiteral,
         .row_id = "ctid",
+        .subquery_alias = " as kelp_q",
+        .quoted_name = QuotedName,
+        .bytes_literal = BytesLiteral,
+        .empty_text = "null",
+        .decode = &kDecode,
     };
     return kDialect;
 }

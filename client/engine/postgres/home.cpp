@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "engine/postgres/schema.h"
 #include "handles/errors.h"
 
 namespace engine::postgres {
@@ -17,8 +18,18 @@ constexpr const char* kPrime =
     " case when pg_catalog.current_setting('lock_timeout') = '0'"
     " then pg_catalog.set_config('lock_timeout', '2000', false) end,"
     " pg_catalog.current_setting('server_version'), pg_catalog.current_setting('max_prepared_transactions')::int > 0,"
-    " pg_catalog.version()";
-enum : int { kServerVersion = 5, kTwoPhase = 6, kBanner = 7 };
+    " pg_catalog.version(),"
+    " pg_catalog.obj_description(pg_catalog.to_regnamespace('kelp')::oid, 'pg_namespace'),"
+    " pg_catalog.has_database_privilege(pg_catalog.current_database(), 'create')"
+    " and pg_catalog.current_setting('server_version_num')::int >= 140000"
+    " and not pg_catalog.pg_is_in_recovery()";
+enum : int { kServerVersion = 5, kTwoPhase = 6, kBanner = 7, kSchema = 8, kMayMakeSchema = 9 };
+
+// What stands in the schema goes before the server's own, and behind the user's.
+constexpr const char* kSetPath =
+    "select pg_catalog.set_config('search_path', pg_catalog.concat_ws(', ', nullif("
+    "pg_catalog.current_setting('search_path'), ''), 'kelp', 'pg_catalog'), false)"
+    " where pg_catalog.to_regnamespace('kelp') is not null";
 
 constexpr const char* kUnknownVersion = "10 or later, PostgreSQL: nobody has logged on yet";
 
@@ -76,12 +87,17 @@ Status Home::Prime(Wire& wire) {
     Status status = wire.Run(kPrime, &result);
     if (!status.Ok()) return status;
     const auto column = [&](int index) { return std::string(PQgetvalue(result.get(), 0, index)); };
+    if (column(kSchema) != kSchemaVersion && column(kMayMakeSchema) == "t") MakeSchema(wire);
+    if (status = wire.Run(kSetPath); !status.Ok()) return status;
     two_phase_.store(column(kTwoPhase) == "t", std::memory_order_relaxed);
     const std::string version = column(kServerVersion) + " KELP server engine, " + column(kBanner);
     const std::lock_guard lock(mutex_);
     version_ = version;
     return status;
 }
+
+// Without it the server's own meaning is all there is: what fails is answered by the statements that need it.
+void Home::MakeSchema(Wire& wire) { (void)wire.RunScript(kSchemaCommands); }
 
 std::string Home::Version() {
     const std::lock_guard lock(mutex_);

@@ -27,6 +27,7 @@ public:
 private:
     Status Log(const Credentials& credentials, std::shared_ptr<const StopRequest> stop, std::unique_ptr<Wire>& wire);
     Status Prime(Wire& wire);
+    static void MakeSchema(Wire& wire);
 
     const std::string url_;
     std::mutex mutex_;    // of what is below

@@ -35,15 +35,10 @@ bool ReadName(std::string_view text, std::vector<std::string>& parts) {
     }
 }
 
-// As the server has it: a word in lower case; what stands in quotes is the name that is shown.
+// As the server has it.
 std::string StoredName(const std::string& part) {
+    if (part.starts_with('"')) return ShownName(std::string_view(part).substr(1, part.size() - 2));
     std::string name = part;
-    if (part.starts_with('"')) {
-        name = part.substr(1, part.size() - 2);
-        if (ShownName(name) != name) return name;    // lower case, in quotes
-        for (const char c : name)
-            if (c >= 'a' && c <= 'z') return name;
-    }
     for (char& c : name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
     return name;
 }

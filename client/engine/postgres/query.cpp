@@ -14,6 +14,7 @@ namespace {
 constexpr std::uint32_t kLargestBatch = 1000;            // rows
 constexpr std::size_t kBatchBytes = std::size_t{1} << 20;
 constexpr std::uint32_t kRowsBetweenPushes = 64;
+constexpr std::string_view kReturningRow = " returning ctid";
 
 Verb VerbOf(std::string_view sql) {
     constexpr struct {
@@ -79,8 +80,26 @@ bool PgQuery::RetypesTimes(std::vector<Oid>& types) const {
     return any;
 }
 
+// insert ... values, of one row or a few: whose row ids are few, too.
+bool PgQuery::InsertsRows() const {
+    if (verb_ != Verb::insert || effect_ != Effect::changes || sql_.ends_with(';')) return false;
+    std::string lower = sql_;
+    for (char& c : lower) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    const auto has = [&](const char* words) { return lower.find(words) != std::string::npos; };
+    return has("values") && !has("select") && !has("returning") && !has("--");
+}
+
+// A row's place is told by the insert itself, where the table has such a thing.
 Status PgQuery::Prepare(std::uint32_t& error_offset) {
     if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return {};
+    tail_ = InsertsRows() ? kReturningRow : std::string_view();
+    Status status = PrepareTyped(error_offset);
+    if (tail_.empty() || status.Ok() || connection_.Broken()) return status;
+    tail_ = {};
+    return PrepareTyped(error_offset);
+}
+
+Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
     std::vector<Oid> types;
     for (const Kind kind : kinds_) types.push_back(TypeOf(kind));
     Status status = PrepareAs(types, error_offset);
@@ -102,7 +121,8 @@ Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_of
     connection_.Forget(name_);
     name_ = connection_.NewName();
     const PgConnection::Guard guard = connection_.SendGuard(false);
-    server.SendPrepare(name_.c_str(), sql_.c_str(), types);
+    server.SendPrepare(name_.c_str(), sql_.append(tail_).c_str(), types);
+    sql_.resize(sql_.size() - tail_.size());
     server.SendDescribe(name_.c_str());
     connection_.SendRelease(guard);
     Status status = connection_.PassGuard(guard);
@@ -127,7 +147,7 @@ Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_of
 Status PgQuery::Describe(const PGresult* result) {
     std::vector<Oid> types;
     for (int index = 0; index < PQnparams(result); ++index) types.push_back(PQparamtype(result, index));
-    const int count = PQnfields(result);
+    const int count = tail_.empty() ? PQnfields(result) : 0;
     columns_.assign(static_cast<std::size_t>(count), {});
     rooms_.resize(columns_.size());
     values_.resize(columns_.size());
@@ -251,6 +271,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         if (batch.failure.Ok() && (failure.Ok() || batch.done > 0)) {
             outcome.executed += batch.sent;
             outcome.affected += batch.affected;
+            if (batch.last_row) outcome.last_row = batch.last_row;
             row += batch.sent;
         }
         size = failure.Ok() ? std::min(2 * size, kLargestBatch) : std::max(size / 8, 1U);
@@ -300,7 +321,11 @@ void PgQuery::ReadBatch(Batch& batch) noexcept {
         if (server.Broken() && !result) return;
         if (!result) ++batch.done;
         else if (Failed(result.get())) batch.failure = server.Answer(result.get(), verb_);
-        else batch.affected += AffectedBy(result.get());
+        else {
+            batch.affected += AffectedBy(result.get());
+            const int rows = tail_.empty() ? 0 : PQntuples(result.get());
+            if (rows > 0) batch.last_row = RowIdOf(PQgetvalue(result.get(), rows - 1, 0));
+        }
     }
 }
 

@@ -5,6 +5,7 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -51,12 +52,15 @@ private:
         std::uint32_t done = 0;        // of them, before the one that failed
         std::uint64_t affected = 0;
         Status failure;                // of the row behind them, or of the batch
+        std::optional<RowId> last_row;
         bool refused = false;          // the row behind those that were sent: by its source, or by a stop
         Status refusal;
     };
 
+    Status PrepareTyped(std::uint32_t& error_offset);
     Status PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset);
     Status Describe(const PGresult* result);
+    [[nodiscard]] bool InsertsRows() const;
     bool RetypesTimes(std::vector<Oid>& types) const;
     Status PrepareAnew();
     [[nodiscard]] bool IsStale(const Status& status) const;
@@ -82,11 +86,12 @@ private:
     Status Fill(const PGresult* result, int row);
 
     PgConnection& connection_;
-    const std::string sql_;
+    std::string sql_;
     const Effect effect_;
     const Verb verb_;
     const std::vector<Kind> kinds_;
     PgConnection::SavepointCommand savepoint_;
+    std::string_view tail_;                // what the server is told behind the statement
     std::string name_;                     // empty: the server has it not
     BoundValues bound_;
     std::vector<Datum> parameters_;

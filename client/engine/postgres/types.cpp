@@ -6,6 +6,7 @@
 #include <charconv>
 #include <cstdlib>
 
+#include "date/format.h"
 #include "handles/errors.h"
 #include "oci.h"
 
@@ -231,12 +232,15 @@ void DescribeType(Oid type, int modifier, Column& column) {
 }
 
 std::string ShownName(std::string_view name) {
-    std::string upper(name);
-    for (char& c : upper) {
-        if (c >= 'A' && c <= 'Z') return std::string(name);
-        if (c >= 'a' && c <= 'z') c = static_cast<char>(c - 'a' + 'A');
+    std::string other(name);
+    bool upper = false, lower = false;
+    for (char& c : other) {
+        const bool is_upper = c >= 'A' && c <= 'Z', is_lower = c >= 'a' && c <= 'z';
+        upper = upper || is_upper;
+        lower = lower || is_lower;
+        if (is_upper || is_lower) c = static_cast<char>(c ^ 0x20);
     }
-    return upper;
+    return upper && lower ? std::string(name) : other;
 }
 
 Reader BinaryReader(Oid type) {
@@ -288,11 +292,24 @@ Status BoundValues::Set(std::span<const Datum> values) {
     return {};
 }
 
+// The customary models, or the engines' own form.
+static int ReadDate(std::string_view text, date::DateTime& value) {
+    if (date::FromEngineText(text, &value) == 0 && value.month != 0) return 0;
+    const int error = date::FromText(text, date::kDateModel, date::kEnglish, date::Scope::date, &value);
+    if (error == 0) return 0;
+    return date::FromText(text, date::kTimestampModel, date::kEnglish, date::Scope::timestamp, &value) == 0 ? 0 : error;
+}
+
 // A text for a text goes as it lies there; for any other type it is the server that reads it, up to a zero.
 int BoundValues::WriteText(std::size_t index, std::string_view text) {
     if (IsTextType(types_[index])) {
         Point(index, text.data(), text.size(), true);
         return 0;
+    }
+    date::DateTime date;
+    if (types_[index] == oid::kTimestamp || types_[index] == oid::kMoment) {
+        const int error = ReadDate(text, date);
+        return error != 0 ? error : WriteTime(index, date);
     }
     std::string& room = rooms_[index];
     room.assign(types_[index] == oid::kBytes ? "\\x" : "");

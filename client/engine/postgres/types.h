@@ -22,7 +22,8 @@ constexpr Oid kNumeric = 1700, kCursor = 1790;
 
 // A column's type, size and numbers by type and modifier; name and nullability are left alone.
 void DescribeType(Oid type, int modifier, Column& column);
-// A column's name as the application sees it: one in lower case was written without quotes, most likely.
+// A name as the application sees it, and the other way round: all of it in the other letter case, unless it has both. What
+// is written without quotes is in upper case there and in lower case here.
 std::string ShownName(std::string_view name);
 
 // Room for a value that the server has in another form.

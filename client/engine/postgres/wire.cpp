@@ -246,6 +246,16 @@ Status Wire::Run(const char* sql, Result* last) noexcept {
     return Drain(last);
 }
 
+// A pipeline takes single commands alone.
+Status Wire::RunScript(const char* commands) noexcept {
+    if (broken_ || !PQexitPipelineMode(connection_)) return Lost();
+    const Result result(PQexec(connection_, commands));
+    Status status = result && PQresultStatus(result.get()) != PGRES_FATAL_ERROR ? Status() : Answer(result.get());
+    if (status.Failed() && Transaction() != PQTRANS_IDLE) Result(PQexec(connection_, "rollback"));
+    Status settled = Settle();
+    return status.Ok() ? settled : status;
+}
+
 // ---- Stopping
 
 void Wire::Wake() noexcept {

@@ -27,7 +27,7 @@ constexpr Dialect::Spelling kTypes[] = {
 std::string Placeholder(std::size_t number) { return '?' + std::to_string(number); }
 
 // The text in which dates are kept.
-std::string DateLiteral(const date::DateTime& value) {
+std::string DateLiteral(const date::DateTime& value, bool) {
     char text[date::kMaxEngineText];
     return "'" + std::string(text, date::ToEngineText(value, text)) + "'";
 }

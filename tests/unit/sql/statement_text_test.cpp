@@ -27,7 +27,7 @@ engine::Dialect TestDialect() {
         .truncate_table = "delete from",
         .cuts_for_update = true,
         .date_literal =
-            [](const date::DateTime& value) {
+            [](const date::DateTime& value, bool) {
                 char text[date::kMaxEngineText];
                 return "'" + std::string(text, date::ToEngineText(value, text)) + "'";
             },
@@ -195,6 +195,39 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"insert into t values(:a :b, :c:i)", "insert into t values(?1 ?2, ?3)"}, {"select 1 ;  ", "select 1"},
     };
     for (const auto& c : cases) EXPECT_EQ(Rewritten(c.text), c.rewritten) << c.text;
+}
+
+// What one dialect asks for and another does not.
+TEST(SqlText, SpellingsThatADialectAsksFor) {
+    static constexpr engine::Dialect::Spelling kNoSize[] = {{"raw", "bytea", true}};
+    static constexpr engine::Dialect::Spelling kCalls[] = {{"nvl", "coalesce"}};
+    static constexpr engine::Dialect::DecodeText kDecode{"[", "|is ", "|then ", "|or ", "|else ", "]"};
+    engine::Dialect dialect = TestDialect();
+    dialect.types = kNoSize;
+    dialect.calls = kCalls;
+    dialect.row_id = "ctid";
+    dialect.subquery_alias = " as q";
+    dialect.quoted_name = [](std::string_view) { return std::string("\"q\""); };
+    dialect.bytes_literal = [](std::string_view digits) { return "<" + std::string(digits) + ">"; };
+    dialect.empty_text = "null";
+    dialect.decode = &kDecode;
+    const struct { const char* text; const char* rewritten; } cases[] = {
+        {"create table t(a raw(9) not null, b raw)", "create table t(a bytea not null, b bytea)"},
+        {"select nvl(a, ''), b.nvl(1), nvl from t", "select coalesce(a, null), b.nvl(1), nvl from t"},
+        {"select rowid, t.rowid from t", "select ctid, t.ctid from t"},
+        {"select x'0A', x from \"T\"", "select <0A>, x from \"q\""},
+        {"select decode(:a, 1, 'x', 2, f(3, 4)), decode(a, 1, 2, 3) from t",
+         "select [?1|is  1|then  'x'|or  2|then  f(3, 4)], [a|is  1|then  2|else  3] from t"},
+        {"select decode(a, decode(b, 1, 2), 3), decode(a, 'hex') from t",
+         "select [a|is  [b|is  1|then  2]|then  3], decode(a, 'hex') from t"},
+        {"select (select 1) from (select 2), (values(1)) join (select 3) x on 1 = 1 where a in (select 4)",
+         "select (select 1) from (select 2) as q1, (values(1)) as q2 join (select 3) x on 1 = 1 where a in (select 4)"},
+        {"select f(from_a, (select 1)), (select b from (select 2 from t)) from t",
+         "select f(from_a, (select 1)), (select b from (select 2 from t) as q1) from t"}};
+    for (const auto& c : cases) {
+        const sql::StatementText statement = sql::Scan(c.text);
+        EXPECT_EQ(sql::Rewrite(c.text, statement, statement.steps[0], dialect).sql, c.rewritten) << c.text;
+    }
 }
 
 TEST(SqlText, EngineOffsetsPointIntoTheApplicationsText) {

@@ -41,9 +41,13 @@ public:
         return place == std::string::npos ? cluster_ : cluster_.substr(0, place + 1) + name_ + cluster_.substr(place + 9);
     }
     [[nodiscard]] std::string Owner() const { return "ann_" + name_; }    // whose password is secret
-    // As the superuser, on the cluster's own database; answers the first value.
-    std::string Run(const std::string& sql) const {
-        PGconn* const connection = PQconnectdb(cluster_.c_str());
+    // As the superuser, on the cluster's own database, or in this one; answers the first value.
+    std::string Run(const std::string& sql) const { return Run(cluster_, sql); }
+    std::string RunHere(const std::string& sql) const { return Run(Url(), sql); }
+
+private:
+    static std::string Run(const std::string& url, const std::string& sql) {
+        PGconn* const connection = PQconnectdb(url.c_str());
         PQsetNoticeProcessor(connection, [](void*, const char*) {}, nullptr);
         PGresult* const result = PQexec(connection, sql.c_str());
         const ExecStatusType status = PQresultStatus(result);
@@ -54,6 +58,5 @@ public:
         return value;
     }
 
-private:
     std::string cluster_, name_;
 };

@@ -1,4 +1,5 @@
-// A session on a private database in memory, and short forms of the calls on statements. Answers are 0 or the number of
+// A session on a private database, in memory or, with KELP_TEST_ENGINE=postgres, on the server of the test run; and short
+// forms of the calls on statements. Answers are 0 or the number of
 // the first record, so that a test reads like a table of numbers.
 #pragma once
 
@@ -6,6 +7,7 @@
 
 #include <array>
 #include <cstring>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <type_traits>
@@ -14,6 +16,7 @@
 
 #include "kelpci.h"
 #include "oci.h"
+#include "support/postgres_database.h"
 
 // The calls, on handles that each thread may have of its own.
 struct StatementCalls {
@@ -43,7 +46,7 @@ struct StatementCalls {
     static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
 
     sword Logon(OCISvcCtx** context) const {
-        const std::string database = Encoded(":memory:");
+        const std::string database = Encoded(database_);
         return OCILogon(env, err, context, nullptr, 0, nullptr, 0, Bytes(database), Size(database));
     }
     sb4 Answer(sword rc) const {
@@ -181,13 +184,34 @@ struct StatementCalls {
     OCISvcCtx* svc = nullptr;
     OCIStmt* stmt = nullptr;
     ub4 mode_ = OCI_DEFAULT;
+    std::string database_ = ":memory:";
 };
+
+// Functions of the embedded engine's own that the tests ask with, for the server.
+constexpr const char* kEmbeddedFunctions =
+    "create function join_texts(text, text, text) returns text language sql immutable as"
+    " $$ select case when $2 is null or $1 is null then coalesce($1, $2) else concat($1, $3, $2) end $$;"
+    "create function join_texts(text, text) returns text language sql immutable as $$ select join_texts($1, $2, ',') $$;"
+    "create aggregate group_concat(text) (sfunc = join_texts, stype = text);"
+    "create aggregate group_concat(text, text) (sfunc = join_texts, stype = text);"
+    "create function join_numbers(text, numeric) returns text language sql immutable as"
+    " $$ select join_texts($1, $2::text) $$;"
+    "create aggregate group_concat(numeric) (sfunc = join_numbers, stype = text);"
+    "create function hex(bytea) returns text language sql immutable as $$ select upper(encode($1, 'hex')) $$;"
+    "create function zeroblob(int) returns bytea language sql immutable as $$ select decode(repeat('00', $1), 'hex') $$;"
+    "create function printf(text, int, text) returns text language sql immutable as $$ select repeat($3, $2) $$";
 
 class StatementTest : public testing::Test, protected StatementCalls {
 protected:
     explicit StatementTest(ub4 mode = OCI_DEFAULT) { mode_ = mode; }
 
     void SetUp() override {
+        const char* const engine = std::getenv("KELP_TEST_ENGINE");
+        if (engine && std::string_view(engine) == "postgres") {
+            server_ = std::make_unique<PostgresDatabase>();
+            database_ = server_->Url();
+            server_->RunHere(kEmbeddedFunctions);
+        }
         ASSERT_EQ(OCIEnvCreate(&env, mode_, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
         err = New<OCIError>(OCI_HTYPE_ERROR);
         ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
@@ -201,6 +225,10 @@ protected:
     using StatementCalls::Run;    // and not the base's
     // Handles for another thread of the same session.
     [[nodiscard]] StatementCalls Another() const {
-        return {env, New<OCIError>(OCI_HTYPE_ERROR), svc, New<OCIStmt>(OCI_HTYPE_STMT), mode_};
+        return {env, New<OCIError>(OCI_HTYPE_ERROR), svc, New<OCIStmt>(OCI_HTYPE_STMT), mode_, database_};
     }
+    [[nodiscard]] bool OnServer() const { return server_ != nullptr; }    // what is the embedded engine's alone is asked there
+
+private:
+    std::unique_ptr<PostgresDatabase> server_;
 };
