@@ -17,6 +17,11 @@ void AddErrorCommands(HandlerTable& handlers);
 void AddFetchAllCommand(HandlerTable& handlers);
 void AddFileCommands(HandlerTable& handlers);
 void AddHandleCommands(HandlerTable& handlers);
+void AddLegacyAreaCommands(HandlerTable& handlers);
+void AddLegacyDescribeCommands(HandlerTable& handlers);
+void AddLegacyLoginCommands(HandlerTable& handlers);
+void AddLegacyLongCommands(HandlerTable& handlers);
+void AddLegacyValueCommands(HandlerTable& handlers);
 void AddLobCommands(HandlerTable& handlers);
 void AddLobTransferCommands(HandlerTable& handlers);
 void AddNumberCommands(HandlerTable& handlers);
@@ -47,6 +52,11 @@ inline constexpr void (*kCommandFamilies[])(HandlerTable&) = {
     AddFetchAllCommand,
     AddFileCommands,
     AddHandleCommands,
+    AddLegacyAreaCommands,
+    AddLegacyDescribeCommands,
+    AddLegacyLoginCommands,
+    AddLegacyLongCommands,
+    AddLegacyValueCommands,
     AddLobCommands,
     AddLobTransferCommands,
     AddNumberCommands,

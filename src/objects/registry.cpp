@@ -178,11 +178,14 @@ void ReportOverflow(Kind kind) {
     Message(kError, InfoOf(kind).overflow, static_cast<long>(InfoOf(kind).capacity));
 }
 
+bool MayBeName(const char* name) {
+    if (!IsNull(name) && !IsInvalid(name)) return true;
+    Message(kError, "Variable name NULL not allowed\n");
+    return false;
+}
+
 NamedObject* Register(Kind kind, const char* name, void* object, void* parent) {
-    if (IsNull(name) || IsInvalid(name)) {
-        Message(kError, "Variable name NULL not allowed\n");
-        return nullptr;
-    }
+    if (!MayBeName(name)) return nullptr;
     for (NamedObject& slot : SlotsOf(kind)) {
         if (slot.in_use) continue;
         kTables[static_cast<size_t>(kind)].clear(slot);

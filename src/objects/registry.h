@@ -154,9 +154,12 @@ const char* OutputName(const char* word);
 // Whether the name is taken; prints the kind's message if so.
 bool CheckInUse(Kind kind, const char* name);
 
-// Fills the first free slot after a successful call. "null" and "invalid" print "Variable name NULL not allowed\n", a
-// full table its overflow message; both give null.
+// Fills the first free slot after a successful call. A name that may not be, which is said, and a full table, which
+// prints its overflow message, give null.
 NamedObject* Register(Kind kind, const char* name, void* object, void* parent);
+
+// Whether an object may be called so: "null" and "invalid" print "Variable name NULL not allowed\n" and may not.
+bool MayBeName(const char* name);
 
 // Frees the first slot of that name after a successful call; "Handle %s not found\n" when there is none.
 void Release(Kind kind, const char* name);

@@ -24,13 +24,20 @@ DataTarget TargetOf(MemBuffer& buffer) {
             buffer.call_indicators,
             buffer.call_lengths,
             buffer.call_return_codes,
-            &buffer.current_element};
+            &buffer.current_element,
+            buffer.scale,
+            buffer.viewed == nullptr ? buffer.call_length : buffer.value_stride,
+            buffer.field_stride};
 }
 
 DataTarget TargetOf(MemStruct& record, StructMember& member) {
     const ViewPlaces places = PlacesOf(record, member, 0);
-    return {places.value,  member.shape.size,  static_cast<uint16_t>(member.shape.type), places.indicator,
-            places.length, places.return_code, &member.current_element};
+    return {places.value,      member.shape.size,
+            static_cast<uint16_t>(member.shape.type),
+            places.indicator,  places.length,
+            places.return_code, &member.current_element,
+            member.shape.scale, record.row_size,
+            record.row_size};
 }
 
 // --- Layout ----------------------------------------------------------------------------------------------------------

@@ -72,6 +72,9 @@ struct DataTarget {
     uint16_t* length = nullptr;
     uint16_t* return_code = nullptr;
     uint32_t* current_element = nullptr;
+    int16_t scale = 0;        // of packed decimal
+    uint32_t value_skip = 0;  // bytes from one element's value to the next,
+    uint32_t field_skip = 0;  // and from one indicator, length or return code
 };
 // Looks the word up among the buffers, then among the structs (of which `member` says which member). False when the
 // command ends here: "null", an unknown name ("Struct %s not found\n") or a bad index, each with its message.

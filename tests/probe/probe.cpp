@@ -11,7 +11,8 @@
 //   POSITION[+OFFSET]=TYPE:VALUE   what stands at POSITION, counted from 1, is an output to fill, OFFSET bytes behind its
 //                                  beginning: TYPE is i1, i2, i4, i8 for integers by width, f8 for a double, t for a
 //                                  terminated text, b for bytes in hexadecimal, p and x for a pointer to such a text and
-//                                  such bytes, h for a pointer to a new object or, with a number, to that one
+//                                  such bytes, h for a pointer to a new object or, with a number, to that one, w for
+//                                  a text where the pointer there leads, c for the context last given for pieces
 //   POSITION?TYPE                  records what stands at POSITION: i1 to i8; tN, N characters; p, the text or texts
 //                                  that pointers there lead to, up to a null pointer
 //   call:KIND:ARGUMENT...          calls what the driver has installed and records what it gave (CallBack says how)
@@ -50,7 +51,8 @@ struct Answer {
 
 // Callbacks of the driver, the last of each kind, and their contexts.
 struct Installed {
-    void *in_context = nullptr, *out_context = nullptr, *define_context = nullptr, *lob_context = nullptr;
+    void *in_context = nullptr, *out_context = nullptr, *define_context = nullptr, *lob_context = nullptr,
+         *piece_context = nullptr;
     OCICallbackInBind in = nullptr;
     OCICallbackOutBind out = nullptr;
     OCICallbackDefine define = nullptr;
@@ -348,6 +350,14 @@ void Install(State& state, OCISvcCtx*, OCIError*, OCILobLocator*, ub4*, ub4, voi
     state.installed.lob_context = context;
     state.installed.write = write;
 }
+void Install(State& state, Cda_Def*, ub1 opcode, sword, ub1* context, sb4, sword, sword, sb2*, text*, sb4, sword, ub2*,
+             ub2*, sb4, sb4, sb4, sb4) {
+    if (opcode == 0) state.installed.piece_context = context;
+}
+void Install(State& state, Cda_Def*, ub1 opcode, text*, sb4, ub1* context, sb4, sword, sword, sb2*, ub2*, ub2*, sb4,
+             sb4, sb4, sb4, ub4, ub4*, text*, sb4, sword) {
+    if (opcode == 0) state.installed.piece_context = context;
+}
 
 void* MakeObject(State& state) {
     constexpr size_t kObjectSize = 256;
@@ -364,10 +374,12 @@ const void* Object(const State& state, const std::string& number) {
     return nullptr;
 }
 
-void HandOut(State& state, const std::vector<Argument>& arguments) {
+// Pointers that texts are written behind are the caller's, and stay.
+void HandOut(State& state, const std::vector<Argument>& arguments, const std::vector<Output>& outputs) {
     for (const Argument& argument : arguments) {
         if (argument.form != Argument::place) continue;
-        if (!argument.address) return;
+        const auto is_behind = [](const Output& output) { return output.type == "w"; };
+        if (!argument.address || std::ranges::any_of(outputs, is_behind)) return;
         *static_cast<void**>(const_cast<void*>(argument.address)) = MakeObject(state);
         return;
     }
@@ -393,6 +405,8 @@ void Fill(State& state, const Output& output, const std::vector<Argument>& argum
     else if (output.type == "x") Store(place, KeepText(Bytes(output.value)));
     else if (output.type == "h" && !output.value.empty()) Store(place, Object(state, output.value));
     else if (output.type == "h") Store(place, MakeObject(state));
+    else if (output.type == "w") std::strcpy(Load<char*>(place), output.value.c_str());
+    else if (output.type == "c") Store(place, state.installed.piece_context);
     else if (output.type == "b") std::memcpy(const_cast<char*>(place), KeepText(Bytes(output.value)), output.value.size() / 2);
     else std::memcpy(const_cast<char*>(place), output.value.c_str(), output.value.size() + 1);
 }
@@ -443,7 +457,7 @@ struct Entry<Result(Parameters...), kIndex> {
         for (const Output& shown : answer.shown) Show(state, shown, arguments);
         Install(state, parameters...);
         for (const auto& words : answer.callbacks) CallBack(state, words);
-        if (answer.result == 0) HandOut(state, arguments);
+        if (answer.result == 0) HandOut(state, arguments, answer.outputs);
         for (const Output& output : answer.outputs) Fill(state, output, arguments);
         if constexpr (std::is_pointer_v<Result>)
             return answer.result ? static_cast<Result>(MakeObject(state)) : nullptr;

@@ -147,10 +147,18 @@ inline bool SetTextWords(TextArgument& text, char** words) {
     return SetTextWord(text, words[0], DecodeLong(words[1]));
 }
 // A password: the start-up password stands in for any but "null", where that was asked for; a length of 0 stays 0.
+struct PasswordWord {
+    PasswordWord(const char* word, long typed_length) : text(word), length(typed_length) {
+        if (!replace_password || IsNull(word)) return;
+        text = start_up_password.c_str();
+        if (length != 0) length = static_cast<long>(start_up_password.size());
+    }
+    const char* text;
+    long length;
+};
 inline bool SetPassword(TextArgument& password, const char* word, long length) {
-    if (!replace_password || IsNull(word)) return password.Set(word, length, TextArea::four_times);
-    const auto own_length = length == 0 ? 0L : static_cast<long>(start_up_password.size());
-    return password.Set(start_up_password.c_str(), own_length, TextArea::four_times);
+    const PasswordWord given(word, length);
+    return password.Set(given.text, given.length, TextArea::four_times);
 }
 // A text that the library takes up to its closing zero.
 inline bool SetClosedText(TextArgument& text, const char* word) {

@@ -5,6 +5,7 @@
 #include <algorithm>
 
 #include "commands/families.h"
+#include "commands/shared/pieces.h"
 #include "commands/shared/word_arguments.h"
 #include "core/messages.h"
 #include "objects/buffers.h"
@@ -42,15 +43,6 @@ uint16_t* ReturnCodeFor(const MemBuffer& buffer, ub4 row) {
 // What the buffer has for the row, as the listing of inputs counts it.
 ub4 LengthOfInput(const MemBuffer& buffer, ub4 row) {
     return std::min<ub4>(*buffer.Length(row), buffer.element_size);
-}
-
-// Makes the arrays of 32-bit lengths when they are missing. False without memory, which has been said.
-bool AttachLengths(MemBuffer& buffer) {
-    const size_t size = std::max<size_t>(buffer.array_size, 1) * sizeof(uint32_t);
-    DynamicData& dynamic = buffer.dynamic;
-    if (dynamic.previous_lengths == nullptr) dynamic.previous_lengths = static_cast<uint32_t*>(GetMem(size));
-    if (dynamic.piece_lengths == nullptr) dynamic.piece_lengths = static_cast<uint32_t*>(GetMem(size));
-    return dynamic.previous_lengths != nullptr && dynamic.piece_lengths != nullptr;
 }
 
 // --- The list that a bind hands out ----------------------------------------------------------------------------------
@@ -218,9 +210,6 @@ const char* NameOf(Kind kind, const void* handle) {
     return slot == nullptr ? "unknown" : slot->name;
 }
 
-constexpr const char* kPieceLines[] = {"piece=OCI_ONE_PIECE\n", "piece=OCI_FIRST_PIECE\n", "piece=OCI_NEXT_PIECE\n",
-                                       "piece=OCI_LAST_PIECE\n"};
-
 // The words of the longer form: each may refuse its output, which is not printed then.
 enum PieceWord { kHandle = 3, kType, kDirection, kIteration, kIndex, kPiece };
 
@@ -244,7 +233,7 @@ void PrintPieceInfo(const PieceInfo& info, const PieceWords& words) {
         Message(kOutput, "in_out=%s\n", info.direction == OCI_PARAM_IN ? "OCI_PARAM_IN" : "OCI_PARAM_OUT");
     if (words.Wants(kIteration)) Message(kOutput, "iter=%ld\n", static_cast<long>(info.iteration));
     if (words.Wants(kIndex)) Message(kOutput, "idx=%ld\n", static_cast<long>(info.index));
-    if (words.Wants(kPiece) && info.piece < std::size(kPieceLines)) MessageText(kOutput, kPieceLines[info.piece]);
+    if (words.Wants(kPiece)) PrintPiece(info.piece);
 }
 
 // What was learned is printed before the trace line.
