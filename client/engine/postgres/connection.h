@@ -34,7 +34,7 @@ public:
     Status Begin(TransactionMode mode) override;
     Status Commit() override;
     Status Rollback() override;
-    [[nodiscard]] bool InTransaction() const override { return in_transaction_; }
+    [[nodiscard]] bool InTransaction() const override { return in_transaction_ && !wire_->Broken(); }
     Status SetMark() override;
     Status UndoToMark() override;
     Status DropMark() override;

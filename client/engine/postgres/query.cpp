@@ -5,6 +5,7 @@
 #include <array>
 #include <cstdlib>
 #include <new>
+#include <utility>
 
 #include "handles/errors.h"
 
@@ -63,6 +64,7 @@ PgQuery::PgQuery(PgConnection& connection, const StatementSource& source)
 PgQuery::~PgQuery() {
     Close();
     connection_.Forget(name_);
+    connection_.Forget(whole_name_);
 }
 
 // ---- Preparing
@@ -119,6 +121,8 @@ Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
 Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset) {
     Wire& server = connection_.Server();
     connection_.Forget(name_);
+    connection_.Forget(std::exchange(whole_name_, {}));
+    whole_ = Whole::unknown;
     name_ = connection_.NewName();
     const PgConnection::Guard guard = connection_.SendGuard(false);
     server.SendPrepare(name_.c_str(), sql_.append(tail_).c_str(), types);
@@ -254,11 +258,18 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
     const bool delivers = run.returned && !columns_.empty();
     std::uint32_t size = kLargestBatch;
     std::uint32_t stop = run.last;
+    std::uint32_t singly = run.first;    // rows below go one by one
     for (std::uint32_t row = run.first; row < run.last;) {
         const bool was_in_transaction = connection_.InTransaction();
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
         Batch batch;
-        if (row == stop) batch.refusal = PgConnection::Stopped();
+        const bool whole = row >= singly && row < stop && !delivers && stop == run.last && PrepareWhole(run.last - row);
+        if (whole) {
+            batch = RunWhole(source, row, run.last);
+            singly = row + batch.sent;
+            if (batch.refusal.Number() == errors::kCancelled) stop = singly;
+            if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !connection_.Broken()) continue;
+        } else if (row == stop) batch.refusal = PgConnection::Stopped();
         else if (delivers) batch = RunReturning(source, row, *run.returned);
         else batch = RunBatch(source, row, last, stop == run.last);
         if (batch.refusal.Number() == errors::kCancelled) stop = row + batch.sent;

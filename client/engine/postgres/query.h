@@ -70,6 +70,10 @@ private:
     Status ExecuteSavepoint(ArrayOutcome& outcome);
     Status ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome);
     Batch RunBatch(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds);
+    bool PrepareWhole(std::uint32_t rows);
+    void AppendRow();
+    Wire::Values FinishArrays(std::uint32_t rows);
+    Batch RunWhole(RowSource& source, std::uint32_t first, std::uint32_t last);
     void ReadBatch(Batch& batch) noexcept;
     Batch RunReturning(RowSource& source, std::uint32_t row, RowSink& sink);
     Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);
@@ -95,6 +99,9 @@ private:
     std::string name_;                     // empty: the server has it not
     BoundValues bound_;
     std::vector<Datum> parameters_;
+    enum class Whole : std::uint8_t { unknown, impossible, ready } whole_ = Whole::unknown;
+    std::string whole_name_;               // of the statement over arrays
+    std::vector<std::string> arrays_;
     std::vector<Column> columns_;
     std::vector<Reader> readers_;
     std::vector<ValueRoom> rooms_;

@@ -195,10 +195,6 @@ const TypeRow* Find(Oid type) {
     return row != std::end(kTypes) && row->oid == type ? row : nullptr;
 }
 
-bool IsTextType(Oid type) {
-    return type == oid::kText || type == kVarying || type == kFixed || type == kName || type == kUnknown;
-}
-
 // The modifier of a number: its precision above, its scale, of eleven bits with a sign, below.
 void DescribeNumber(int modifier, Column& column) {
     const int packed = modifier - kModifierHeader;
@@ -251,6 +247,10 @@ Reader BinaryReader(Oid type) {
 Reader TextReader(Oid type) {
     const TypeRow* row = Find(type);
     return row ? row->text : ReadText;
+}
+
+bool IsTextType(Oid type) {
+    return type == oid::kText || type == kVarying || type == kFixed || type == kName || type == kUnknown;
 }
 
 // ---- Writing

@@ -38,6 +38,7 @@ union ValueRoom {
 using Reader = int (*)(std::string_view bytes, ValueRoom& room, Datum& value);
 Reader BinaryReader(Oid type);    // null: the type is read as text
 Reader TextReader(Oid type);
+bool IsTextType(Oid type);
 
 // The type that a placeholder is declared as by the kind of its values; 0: the server finds one.
 Oid TypeOf(Kind kind);

@@ -138,6 +138,37 @@ TEST_P(Contract, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
     EXPECT_EQ(all.affected, 11u) << "nothing is changed";
 }
 
+// Long enough for an engine to hand it over in another way.
+TEST_P(Contract, LongArraysKeepTheirValuesAndFailTheirRows) {
+    ASSERT_EQ(Run("create table t(n integer primary key, d double precision, p numeric(38), v varchar(9), m timestamp)"), 0);
+    const OCINumber number = Number("-12345678901234567890123456789012345678");
+    const date::DateTime moment{.year = 1999, .month = 12, .day = 31, .hour = 23, .nanosecond = 500000000};
+    const std::vector<Datum> shape{Integer(1), Real(-0.25), Decimal(number), Text("\xC3\xA4 b"), Moment(moment)};
+    const auto insert = Prepared("insert into t values(%1, %2, %3, %4, %5)", shape);
+    Rows rows;
+    rows.rows.assign(2500, shape);
+    for (std::size_t row = 0; row < 2500; ++row) rows.rows[row][0] = Integer(static_cast<std::int64_t>(row));
+    for (const std::size_t twice : {3u, 1500u, 1501u}) rows.rows[twice][0] = Integer(0);
+    rows.rows[7] = {Integer(7), Null(), Null(), Null(), Null()};
+    rows.refused_row = 2400;
+    engine::ArrayOutcome outcome;
+    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 0, .last = 2500, .all_rows = true}, outcome).Ok());
+    EXPECT_EQ(outcome.executed, 2496u);
+    EXPECT_EQ(outcome.affected, 2496u);
+    std::string failed;
+    for (const auto& failure : outcome.failures)
+        failed += std::to_string(failure.row) + ':' + std::to_string(failure.status.Number()) + ' ';
+    EXPECT_EQ(failed, "3:1 1500:1 1501:1 2400:1722 ");
+    EXPECT_EQ(Query("select * from t where n in (7, 2499) order by n"),
+              "7,null,null,null,null;2499,real -0.25,decimal -12345678901234567890123456789012345678,\xC3\xA4 b,"
+              "time 1999-12-31 23:00:00.5;");
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    engine::ArrayOutcome stopped;
+    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 4, .last = 2500}, stopped).Ok());
+    EXPECT_EQ(stopped.executed, 1497u) << "0 is the first of two";
+    EXPECT_EQ(Count(), "1497;");
+}
+
 TEST_P(Contract, ChangesReturnTheirRowsByExecution) {
     MakeNumbers();
     const auto update = Prepared("update t set n = n + 10 where n <= %1 returning n, n - 10", std::vector{Integer(1)});

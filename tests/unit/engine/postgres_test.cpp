@@ -1,0 +1,180 @@
+// What the PostgreSQL engine does in its own way: servers that cannot be reached or go away, deadlocks, cursors, notices,
+// what the server says as published numbers.
+#include <sys/socket.h>
+#include <sys/un.h>
+
+#include <chrono>
+#include <thread>
+
+#include "engine/engine_fixture.h"
+#include "support/postgres_database.h"
+
+namespace {
+
+using engine::TransactionMode;
+
+class Postgres : public EngineFixture {
+protected:
+    std::string FreshName() override {
+        server_ = std::make_unique<PostgresDatabase>();
+        return server_->Url();
+    }
+    void TearDown() override {
+        EngineFixture::TearDown();
+        server_.reset();
+    }
+    // Ends the server's side of the session.
+    void Kill() {
+        const std::string process = Query("select pg_backend_pid()");
+        server_->Run("select pg_terminate_backend(" + process.substr(0, process.size() - 1) + ", 5000)");
+    }
+    std::unique_ptr<PostgresDatabase> server_;
+};
+
+TEST_F(Postgres, ServerThatCannotBeReached) {
+    std::unique_ptr<engine::Database> none;
+    const struct { std::string url; int number; } cases[] = {
+        {"postgresql:///x?host=/no/such", 12541},
+        {"postgresql://kelp@127.0.0.1:1/x", 12541},
+        {"postgresql://no.such.host.invalid/x", 12154},
+        {"postgresql://x:y:z/", 12560},
+        {server_->Url().replace(server_->Url().find("/t"), 2, "/nowhere"), 12514}};
+    for (const auto& c : cases) EXPECT_EQ(Answer(engine::Open(c.url, none)), c.number) << c.url;
+
+    // Somebody listens and says nothing.
+    const int listener = socket(AF_UNIX, SOCK_STREAM, 0);
+    sockaddr_un place{.sun_family = AF_UNIX, .sun_path = {}};
+    std::snprintf(place.sun_path, sizeof place.sun_path, "%s/.s.PGSQL.5432", folder_.c_str());
+    ASSERT_EQ(bind(listener, reinterpret_cast<const sockaddr*>(&place), sizeof place) + listen(listener, 1), 0);
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(Answer(engine::Open("postgresql:///x?connect_timeout=2&host=" + folder_, none)), 12170);
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
+    close(listener);
+}
+
+// At each call: 3113 first, 3114 then, whatever was open; and a new logon works.
+TEST_F(Postgres, ServerThatGoesAway) {
+    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    ASSERT_EQ(Run("insert into t select generate_series(1, 3000)"), 0);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    engine::ArrayOutcome outcome;
+    Rows one{{Integer(1)}};
+    bool flag = false;
+    std::uint32_t offset = 0;
+    std::unique_ptr<engine::Query> query, insert, made;
+    const std::pair<const char*, std::function<Status()>> calls[] = {
+        {"ping", [&] { return connection_->Ping(); }},
+        {"compile", [&] { return connection_->Compile({"select 1", Effect::reads, {}}, made, offset); }},
+        {"execute", [&] { return insert->ExecuteArray(one, {}, outcome); }},
+        {"open", [&] { return query->Open(one, {}); }},
+        {"begin", [&] { return connection_->Begin(TransactionMode::serializable); }},
+        {"mark", [&] { return connection_->SetMark(); }},
+        {"commit", [&] { return connection_->Commit(); }},
+        {"rollback", [&] { return connection_->Rollback(); }},
+        {"prepare", [&] { return connection_->Prepare({.format = 1}, flag); }}};
+    for (const auto& [name, call] : calls) {
+        insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
+        query = Opened("select n from t");
+        const bool in_transaction = name[0] == 'c' || name[0] == 'r' || name[0] == 'p';
+        if (in_transaction) { ASSERT_EQ(Run("delete from t where n = 1"), 0); }
+        Kill();
+        const Status status = call();
+        const int number = Answer(status);
+        EXPECT_EQ(number, 3113) << name << ": " << status.Detail();
+        EXPECT_EQ(Answer(call()), 3114) << name;
+        EXPECT_TRUE(connection_->Broken()) << name;
+        EXPECT_FALSE(connection_->InTransaction()) << name;
+        query->Close();
+        query.reset();
+        insert.reset();
+        connection_ = Connect();
+        EXPECT_EQ(Query("select count(*) from t"), "3000;") << name;
+    }
+}
+
+TEST_F(Postgres, DeadlockUndoesOneStatement) {
+    ASSERT_EQ(Run("create table t(n integer, a integer)"), 0);
+    ASSERT_EQ(Run("insert into t values(1, 0), (2, 0)"), 0);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    const auto other = Connect(std::make_shared<engine::StopRequest>());
+    ASSERT_EQ(Run("update t set a = 1 where n = 1"), 0);
+    ASSERT_EQ(Run(*other, "update t set a = 2 where n = 2"), 0);
+    int theirs = 0;
+    std::thread waiting([&] { theirs = Run(*other, "update t set a = 2 where n = 1"); });
+    const int ours = Run("update t set a = 1 where n = 2");
+    waiting.join();
+    EXPECT_TRUE((ours == 60 && theirs == 54) || (ours == 54 && theirs == 60) || (ours == 60) != (theirs == 60))
+        << ours << ' ' << theirs;
+    EXPECT_TRUE(connection_->InTransaction() && other->InTransaction()) << "what was done before stays";
+}
+
+TEST_F(Postgres, CursorsAndNotices) {
+    ASSERT_EQ(Run("create function f() returns refcursor language plpgsql as $$ declare c refcursor := 'the \"one\"'; "
+                  "begin raise notice 'hello'; open c for select generate_series(1, 3); return c; end $$"), 0);
+    const auto outer = Opened("select f()");
+    EXPECT_EQ(outer->Columns()[0].type, SQLT_RSET);
+    std::unique_ptr<engine::Query> inner;
+    struct Taking : engine::RowSink {
+        std::string name;
+        Status Row(std::uint32_t, std::span<const Datum> values) override {
+            EXPECT_EQ(values[0].kind, Kind::cursor);
+            name = values[0].Text();
+            return {};
+        }
+    } taken;
+    bool more = false;
+    ASSERT_EQ(Answer(outer->Fetch(taken, 1, more)), 0);
+    ASSERT_EQ(Answer(connection_->OpenCursor(View(Kind::cursor, taken.name), inner)), 0);
+    EXPECT_EQ(Rest(*inner), "1;2;3;");
+    EXPECT_TRUE(connection_->InTransaction()) << "cursors live in one";
+    const auto notices = connection_->TakeNotices();
+    ASSERT_EQ(notices.size(), 1u);
+    EXPECT_EQ(notices[0].Detail(), "hello");
+    EXPECT_FALSE(notices[0].Failed());
+}
+
+TEST_F(Postgres, WhatTheServerSaysAsNumbers) {
+    ASSERT_EQ(Run("create table p(n integer primary key)"), 0);
+    ASSERT_EQ(Run("create table c(n integer not null check (n < 9), p integer references p, v varchar(2), k numeric(2))"), 0);
+    ASSERT_EQ(Run("insert into p values(1)"), 0);
+    ASSERT_EQ(Run("insert into c values(1, 1, 'a', 1)"), 0);
+    const struct { const char* sql; int number; } cases[] = {
+        {"insert into p values(1)", 1},            {"insert into c(n) values(null)", 1400},
+        {"update c set n = null", 1407},           {"insert into c(n) values(9)", 2290},
+        {"insert into c(n, p) values(1, 2)", 2291}, {"delete from p", 2292},
+        {"insert into c(n, v) values(1, 'abc')", 12899}, {"insert into c(n, k) values(1, 100)", 1438},
+        {"select 1/0", 1476},                      {"select cast('a' as numeric)", 1722},
+        {"select x from p", 904},                  {"select n from p, c", 918},
+        {"select 1 from nowhere", 942},            {"select nosuch(1)", 904},
+        {"select (select n from p union all select 2)", 1427}, {"create table p(n integer)", 955},
+        {"select max(n), n from p", 937},          {"select 1 'x", 1756},
+        {"insert into p values(1, 2)", 913},       {"select 1; select 2", 933}};
+    for (const auto& c : cases) {
+        const std::string answer = EffectOf(c.sql) == Effect::reads ? Query(c.sql) : "error " + std::to_string(Run(c.sql));
+        EXPECT_EQ(answer, "error " + std::to_string(c.number)) << c.sql;
+    }
+    EXPECT_EQ(Query("select count(*) from c"), "1;") << "and the transaction goes on";
+}
+
+TEST_F(Postgres, MeaningsOfTheSchema) {
+    ASSERT_EQ(Run("create table t(d kelp.date, v varchar(10), n numeric)"), 0);
+    ASSERT_EQ(Run("insert into t values('2024-01-31 10:00:00', '5', 0.5)"), 0);
+    const struct { const char* expression; const char* value; } cases[] = {
+        {"5/2", "decimal 2.5"}, {"mod(5, 0)", "5"}, {"d + 1", "time 2024-02-01 10:00:00"},
+        {"d - 1/24", "time 2024-01-31 09:00:00"}, {"d - (d - 2)", "2"}, {"'a' || null", "a"}, {"'a' || n", "a.5"},
+        {"d || ''", "31-JAN-24"}, {"v > 4", "1"}, {"to_char(d, 'DD.MM.RRRR HH24:MI')", "31.01.2024 10:00"},
+        {"to_date('01-JAN-60')", "time 1960-01-01 00:00:00"}, {"trunc(d)", "time 2024-01-31 00:00:00"},
+        {"add_months(d, 1)", "time 2024-02-29 10:00:00"}, {"months_between(d, add_months(d, -2))", "2"},
+        {"substr('abc', -2)", "bc"}, {"substr('abc', 0, 2)", "ab"}, {"instr('banana', 'an', 1, 2)", "4"},
+        {"instr('banana', 'an', -1)", "4"}, {"rawtohex(hextoraw('0aFF'))", "0AFF"}, {"to_char(n)", ".5"},
+        {"next_day(d, 'MON')", "time 2024-02-05 10:00:00"}, {"max(d)", "time 2024-01-31 10:00:00"},
+        {"to_char(d, 'YEAR')", "error 1821"}, {"nvl2(null, 1, 2)", "2"}};
+    for (const auto& c : cases) {
+        const std::string answer = Query(std::string("select ") + c.expression + " from t");
+        EXPECT_EQ(answer, answer.starts_with("error") ? c.value : std::string(c.value) + ';') << c.expression;
+    }
+    EXPECT_EQ(Opened("select max(d) from t")->Columns()[0].type, SQLT_DAT);
+    EXPECT_EQ(Opened("select d + 1 from t")->Columns()[0].type, SQLT_DAT);
+}
+
+}  // namespace
