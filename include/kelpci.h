@@ -15,7 +15,7 @@ typedef struct SQLCA {
     sb4 sqlcabc;          /* size of this structure */
     sb4 sqlcode;          /* 0 done, 100 no data, below 0 the negative error number, else a warning */
     sb2 sqlerrml;         /* bytes used of sqlerrmc */
-    char sqlerrmc[70];    /* text of the error, cut */
+    char sqlerrmc[70];    /* the words behind the number's own text, cut */
     char sqlerrp[8];      /* who says it */
     sb4 sqlerrd[6];
     char sqlwarn[11];
@@ -27,7 +27,8 @@ typedef struct SQLCA {
 /* Blocks of memory that the library still holds, in all environments. */
 sb4 OCI_memGetMemCount(void);
 
-/* Fills `*out` for the resource manager `rmid`. XA_OK; XAER_INVAL when `out` is null or `rmid` was never opened. */
+/* Fills `*out` for the last XA call of this thread about the resource manager `rmid`. XA_OK; XAER_INVAL when `out` is null
+   or there was no such call. */
 int XaGetInfo(int rmid, SQLCA *out);
 
 /* The XA switch. */

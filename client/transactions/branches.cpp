@@ -47,6 +47,7 @@ Status Branches::Create(const BranchKey& key, const std::string& user, Coupling 
     branches_.push_back(branch);
     if (branch->work != work) ++branch->work->branches;
     branch->work->held = true;
+    branch->work->holder = std::this_thread::get_id();
     held = std::move(branch);
     return {};
 }
@@ -59,11 +60,13 @@ Status Branches::Hold(const BranchKey& key, Clock::duration wait, BranchPointer&
         if (!branch) return Error(errors::kNoSuchTransaction);
         if (!branch->work->held) {
             branch->work->held = true;
+            branch->work->holder = std::this_thread::get_id();
             branch->deadline.reset();
             held = std::move(branch);
             return {};
         }
-        if (changed_.wait_until(lock, until) == std::cv_status::timeout && branch->work->held)
+        const bool waits = branch->work->holder != std::this_thread::get_id() && wait.count() > 0;
+        if (!waits || (changed_.wait_until(lock, until) == std::cv_status::timeout && branch->work->held))
             return Error(errors::kAttachedElsewhere);
     }
 }
@@ -95,10 +98,11 @@ void Branches::Remove(const BranchPointer& held, int doom_of_others) noexcept {
     changed_.notify_all();
 }
 
-bool Branches::IsHeld(const BranchKey& key) const {
+bool Branches::AnySuspendedBy(const void* who) const {
     const std::lock_guard lock(mutex_);
-    const BranchPointer branch = Find(key);
-    return branch && branch->work->held;
+    return std::ranges::any_of(branches_, [who](const BranchPointer& branch) {
+        return !branch->work->held && branch->rest == Rest::suspended && branch->suspended_by == who;
+    });
 }
 
 std::vector<engine::Xid> Branches::Prepared(const std::string& database) const {

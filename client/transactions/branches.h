@@ -30,7 +30,8 @@ enum class Coupling : std::uint8_t { tight, loose };
 struct Work {
     std::unique_ptr<engine::Connection> connection;    // at rest: where it is open; null when nothing was begun
     bool began = false;     // the engine's transaction was seen
-    bool held = false;      // of the list
+    bool held = false;      // of the list, as is the next
+    std::thread::id holder; // when held: who waits for himself need not
     std::uint32_t branches = 1;    // that are not finished or prepared
     // Why it is to be rolled back, which the next call answers: its work is lost, or was given up. 0: it is not.
     int doom = 0;
@@ -47,7 +48,7 @@ struct Branch {
     std::shared_ptr<Work> work;
     Rest rest = Rest::idle;                // changed by Release alone
     bool migrates = false;                 // suspended: any thread may take it up
-    const void* suspended_by = nullptr;    // else this one
+    const void* suspended_by = nullptr;    // else who this stands for
     std::optional<Clock::time_point> deadline = {};    // of the list: at rest, when it is rolled back
 };
 using BranchPointer = std::shared_ptr<Branch>;
@@ -70,14 +71,15 @@ public:
     // coupled otherwise, 25351 when one that it is coupled with is held.
     Status Create(const BranchKey& key, const std::string& user, Coupling coupling, std::chrono::seconds timeout,
                   BranchPointer& held);
-    // Holds a branch, waiting for it at most so long: 24756 when there is none, 25351 when it stays held.
+    // Holds a branch, waiting for it at most so long: 24756 when there is none, 25351 when it stays held. The thread that
+    // holds it does not wait.
     Status Hold(const BranchKey& key, Clock::duration wait, BranchPointer& held);
     // Lets a held branch rest; its time starts, unless it is prepared.
     void Release(const BranchPointer& held, Rest rest) noexcept;
     // Ends a held branch. Others that share its work, if any, are doomed with it unless the work goes on.
     void Remove(const BranchPointer& held, int doom_of_others) noexcept;
 
-    [[nodiscard]] bool IsHeld(const BranchKey& key) const;
+    [[nodiscard]] bool AnySuspendedBy(const void* who) const;
     // The prepared ones of a database, in the order of their beginning.
     [[nodiscard]] std::vector<engine::Xid> Prepared(const std::string& database) const;
 

@@ -84,6 +84,7 @@ public:
     [[nodiscard]] const Dialect& GetDialect() const override;
     [[nodiscard]] const Capabilities& GetCapabilities() const override;
     std::string Version() override { return home_->Version(); }
+    [[nodiscard]] std::string Identity() const override { return home_->Where(); }
     Status Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
                    std::unique_ptr<Connection>& connection) override;
 

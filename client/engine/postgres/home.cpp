@@ -91,13 +91,20 @@ Status Home::Prime(Wire& wire) {
     if (status = wire.Run(kSetPath); !status.Ok()) return status;
     two_phase_.store(column(kTwoPhase) == "t", std::memory_order_relaxed);
     const std::string version = column(kServerVersion) + " KELP server engine, " + column(kBanner);
+    std::string where = wire.Where();
     const std::lock_guard lock(mutex_);
     version_ = version;
+    where_ = std::move(where);
     return status;
 }
 
 // Without it the server's own meaning is all there is: what fails is answered by the statements that need it.
 void Home::MakeSchema(Wire& wire) { (void)wire.RunScript(kSchemaCommands); }
+
+std::string Home::Where() {
+    const std::lock_guard lock(mutex_);
+    return where_.empty() ? url_ : where_;
+}
 
 std::string Home::Version() {
     const std::lock_guard lock(mutex_);

@@ -22,6 +22,7 @@ public:
     Status Connect(const Credentials& credentials, std::shared_ptr<const StopRequest> stop,
                    std::unique_ptr<Wire>& wire);
     [[nodiscard]] std::string Version();
+    [[nodiscard]] std::string Where();    // host, port and database; the URL as long as nobody has connected
     [[nodiscard]] bool TwoPhase() const { return two_phase_.load(std::memory_order_relaxed); }
 
 private:
@@ -33,6 +34,7 @@ private:
     std::mutex mutex_;    // of what is below
     std::unique_ptr<Wire> spare_;
     std::string version_;
+    std::string where_;
     std::atomic<bool> two_phase_{false};
 };
 

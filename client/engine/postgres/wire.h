@@ -40,6 +40,9 @@ public:
     [[nodiscard]] PGconn* Libpq() const { return connection_; }
     [[nodiscard]] bool Broken() const { return broken_; }
     // What the server said last: whether a transaction is open, or has failed.
+    [[nodiscard]] std::string Where() const {    // host, port and database
+        return std::string(PQhost(connection_)) + ':' + PQport(connection_) + '/' + PQdb(connection_);
+    }
     [[nodiscard]] PGTransactionStatusType Transaction() const { return PQtransactionStatus(connection_); }
 
     // ---- Sending. A failure breaks off; what was sent before is read by Drain.
