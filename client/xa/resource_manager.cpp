@@ -62,7 +62,8 @@ Answer ResourceManager::LogOn() {
     environment_ = environment;
     auto* const service = Create<ServiceContext>(*environment, OCI_HTYPE_SVCCTX, 0);
     service_ = service;
-    if (Status status = service->LogOn(info_.server, info_.credentials); !status.Ok())
+    if (Status status = service->LogOn({info_.server, {}}, info_.credentials, ServiceContext::EndedBy::logoff);
+        !status.Ok())
         return {CodeOf(status.Number()), std::move(status)};
     const SessionTurn turn(*service);
     if (!turn.link) return {XAER_RMFAIL, turn.status};

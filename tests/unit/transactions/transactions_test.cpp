@@ -1,0 +1,108 @@
+// Branches of OCITransStart between threads and sessions; what a transcript cannot show.
+#include <cstring>
+#include <thread>
+
+#include "support/call_fixture.h"
+#include "xa.h"
+
+namespace {
+
+class Transactions : public CallFixture {
+protected:
+    Transactions() : CallFixture(OCI_THREADED) {}
+    void SetUp() override {
+        Folder();
+        CallFixture::SetUp();
+        stmt_ = New<OCIStmt>(OCI_HTYPE_STMT);
+        for (OCISvcCtx*& svc : svc_) {
+            ASSERT_EQ(LogOn(&svc, "bank"), 0);
+            auto* trans = New<OCITrans>(OCI_HTYPE_TRANS);
+            XID xid{5, 2, 1, "txb"};
+            ASSERT_EQ(Answer(OCIAttrSet(trans, OCI_HTYPE_TRANS, &xid, sizeof xid, OCI_ATTR_XID, err_)), 0);
+            ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, trans, 0, OCI_ATTR_TRANS, err_)), 0);
+        }
+        ASSERT_EQ(Run(0, "create table t(n number)"), 0);
+    }
+    sb4 Run(int session, const char* sql) {
+        EXPECT_EQ(OCIStmtPrepare(stmt_, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), 0);
+        return Answer(OCIStmtExecute(svc_[session], stmt_, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
+    }
+    sb4 Start(int session, uword timeout, ub4 flags) {
+        return Answer(OCITransStart(svc_[session], err_, timeout, flags));
+    }
+
+    OCIStmt* stmt_ = nullptr;
+    OCISvcCtx* svc_[2] = {};
+};
+
+TEST_F(Transactions, ResumingWaitsForAnotherThread) {
+    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
+    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    std::thread other([&] {
+        auto* const err = NewHandle<OCIError>(env_, OCI_HTYPE_ERROR);
+        EXPECT_EQ(Answer(OCITransStart(svc_[1], err, 0, OCI_TRANS_RESUME), err), 25351);
+        EXPECT_EQ(Answer(OCITransStart(svc_[1], err, 30, OCI_TRANS_RESUME), err), 0);
+        EXPECT_EQ(Answer(OCITransCommit(svc_[1], err, OCI_DEFAULT), err), 0);
+    });
+    std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    EXPECT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    other.join();
+    EXPECT_EQ(Run(0, "insert into t select 1 / (case count(*) when 1 then 1 else 0 end) from t"), 0);
+    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24756);
+}
+
+TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
+    ASSERT_EQ(Start(0, 1, OCI_TRANS_NEW), 0);
+    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Run(1, "insert into t values(2)"), 0) << "waits for the lock";
+    EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24761);
+    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24756);
+}
+
+// A session that goes without a word takes its branch with it; a result does not outlive the connection.
+TEST_F(Transactions, SessionsThatGo) {
+    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
+    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    EXPECT_EQ(Answer(OCILogoff(svc_[0], err_)), 2089);
+    EXPECT_EQ(OCIHandleFree(svc_[0], OCI_HTYPE_SVCCTX), OCI_SUCCESS);
+    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24756);
+    EXPECT_EQ(Start(1, 0, OCI_TRANS_NEW), 0);
+    EXPECT_EQ(Run(1, "insert into t values(1)"), 0) << "the lock is free";
+    EXPECT_EQ(Run(1, "create table u(n number)"), 2089);
+    ub4 number = 0;
+    OCIDefine* define = nullptr;
+    const char* const query = "select n from t";
+    EXPECT_EQ(OCIStmtPrepare(stmt_, err_, Text(query), Length(query), OCI_NTV_SYNTAX, OCI_DEFAULT), 0);
+    EXPECT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &number, 4, SQLT_UIN, nullptr, nullptr, nullptr, 0)), 0);
+    EXPECT_EQ(Answer(OCIStmtExecute(svc_[1], stmt_, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Answer(OCITransDetach(svc_[1], err_, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Answer(OCIStmtFetch2(stmt_, err_, 1, OCI_FETCH_NEXT, 0, OCI_DEFAULT)), 1002);
+    EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
+}
+
+TEST_F(Transactions, BranchesInMemoryStayWhereTheyAre) {
+    ASSERT_EQ(Answer(OCILogoff(svc_[0], err_)), 0);
+    ASSERT_EQ(LogOn(&svc_[0], ":memory:"), 0);
+    ASSERT_EQ(Run(0, "create table t(n number)"), 0);
+    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
+    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    EXPECT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 24782);
+    EXPECT_EQ(Answer(OCITransPrepare(svc_[0], err_, OCI_DEFAULT)), 24782);
+    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_TRANS_TWOPHASE)), 24768);
+    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_DEFAULT)), 0);
+}
+
+// A promise that a deferred foreign key would break is not given.
+TEST_F(Transactions, TheFirstPhaseChecksWhatWasDeferred) {
+    ASSERT_EQ(Run(0, "create table p(id integer primary key)"), 0);
+    ASSERT_EQ(Run(0, "create table c(id integer references p deferrable initially deferred)"), 0);
+    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
+    ASSERT_EQ(Run(0, "insert into c values(7)"), 0);
+    EXPECT_EQ(Answer(OCITransPrepare(svc_[0], err_, OCI_DEFAULT)), 2091);
+    EXPECT_EQ(Answer(OCITransCommit(svc_[1], err_, OCI_TRANS_TWOPHASE)), 24756);
+}
+
+}  // namespace

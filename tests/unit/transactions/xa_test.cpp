@@ -1,0 +1,213 @@
+// The XA switch: each call in each state of a branch, arguments, threads of control, time.
+#include <future>
+#include <thread>
+
+#include "support/call_fixture.h"
+
+namespace {
+
+// Two databases, opened as managers 1 and 2; statements of an environment of the test's own.
+class XaCalls : public CallFixture {
+protected:
+    void SetUp() override {
+        Folder();
+        CallFixture::SetUp();
+        stmt_ = New<OCIStmt>(OCI_HTYPE_STMT);
+        ASSERT_EQ(Open(1, "DB=one"), XA_OK);
+        ASSERT_EQ(Open(2, "DB=two"), XA_OK);
+        ASSERT_EQ(Run("one", "create table t(n number)"), 0);
+    }
+    void TearDown() override {
+        for (const int rmid : {1, 2}) EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, rmid, TMNOFLAGS), XA_OK) << rmid;
+        CallFixture::TearDown();
+    }
+
+    static int Open(int rmid, std::string info) { return rmXaSwitch.xa_open_entry(info.data(), rmid, TMNOFLAGS); }
+    static XID Named(std::string_view global, std::string_view branch) {
+        XID xid{9, static_cast<sb4>(global.size()), static_cast<sb4>(branch.size()), {}};
+        (std::string(global) += branch).copy(xid.data, XIDDATASIZE);
+        return xid;
+    }
+    static int Call(int (*xa_switch_t::*entry)(XID*, int, xa_long), XID xid, xa_long flags, int rmid = 1) {
+        return (rmXaSwitch.*entry)(&xid, rmid, flags);
+    }
+    sb4 Run(const char* name, const char* sql) {
+        EXPECT_EQ(OCIStmtPrepare(stmt_, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), 0);
+        return Answer(OCIStmtExecute(xaoSvcCtx(name ? Text(name) : nullptr), stmt_, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
+    }
+    sb4 Change() { return Run("one", "insert into t values(1)"); }
+    static int Recovered(int rmid = 1) {
+        XID found[4];
+        return rmXaSwitch.xa_recover_entry(found, 4, rmid, TMSTARTRSCAN | TMENDRSCAN);
+    }
+    static sb4 Code(int rmid = 1) {
+        SQLCA diagnostics{};
+        EXPECT_EQ(XaGetInfo(rmid, &diagnostics), XA_OK);
+        return diagnostics.sqlcode;
+    }
+
+    OCIStmt* stmt_ = nullptr;
+};
+
+constexpr auto kStart = &xa_switch_t::xa_start_entry;
+constexpr auto kEnd = &xa_switch_t::xa_end_entry;
+constexpr auto kPrepare = &xa_switch_t::xa_prepare_entry;
+constexpr auto kCommit = &xa_switch_t::xa_commit_entry;
+constexpr auto kRollback = &xa_switch_t::xa_rollback_entry;
+constexpr auto kForget = &xa_switch_t::xa_forget_entry;
+
+TEST_F(XaCalls, EachCallInEachState) {
+    enum State { unknown, active, suspended, idle, failed, prepared, kStates };
+    const struct { const char* name; int (*xa_switch_t::*entry)(XID*, int, xa_long); xa_long flags; int codes[kStates]; }
+    calls[] = {
+        // unknown, active, suspended, idle, failed, prepared
+        {"start", kStart, TMNOFLAGS, {XA_OK, XAER_PROTO, XAER_DUPID, XAER_DUPID, XAER_DUPID, XAER_DUPID}},
+        {"join", kStart, TMJOIN, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_RBROLLBACK, XAER_PROTO}},
+        {"resume", kStart, TMRESUME, {XAER_NOTA, XAER_PROTO, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
+        {"end", kEnd, TMSUCCESS, {XAER_NOTA, XA_OK, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
+        {"suspend", kEnd, TMSUSPEND, {XAER_NOTA, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
+        {"fail", kEnd, TMFAIL, {XAER_NOTA, XA_OK, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
+        {"prepare", kPrepare, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_RBROLLBACK, XAER_PROTO}},
+        {"commit", kCommit, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO, XA_OK}},
+        {"one phase", kCommit, TMONEPHASE, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_RBROLLBACK, XAER_PROTO}},
+        {"rollback", kRollback, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_OK, XA_OK}},
+        {"forget", kForget, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
+    };
+    for (int state = unknown; state < kStates; ++state) {
+        for (const auto& call : calls) {
+            SCOPED_TRACE(std::string(call.name) + " in state " + std::to_string(state));
+            const XID xid = Named(call.name, std::to_string(state));
+            if (state != unknown) {
+                ASSERT_EQ(Call(kStart, xid, TMNOFLAGS), XA_OK);
+                ASSERT_EQ(Change(), 0);
+            }
+            const xa_long ends[] = {0, 0, TMSUSPEND, TMSUCCESS, TMFAIL, TMSUCCESS};
+            if (ends[state] != 0) { EXPECT_EQ(Call(kEnd, xid, ends[state]), XA_OK); }
+            if (state == prepared) { EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_OK); }
+            EXPECT_EQ(Recovered(), state == prepared);
+            EXPECT_EQ(Call(call.entry, xid, call.flags), call.codes[state]);
+            EXPECT_EQ(Code() == 0, call.codes[state] == XA_OK);
+            (void)Call(kEnd, xid, TMFAIL);    // whatever it is now, it goes
+            (void)Call(kRollback, xid, TMNOFLAGS);
+            EXPECT_EQ(Call(kForget, xid, TMNOFLAGS), XAER_NOTA);
+        }
+    }
+}
+
+TEST_F(XaCalls, ArgumentsAreJudgedFirst) {
+    const XID good = Named("g", "b");
+    const struct { int (*xa_switch_t::*entry)(XID*, int, xa_long); XID xid; xa_long flags; int rmid; int code; } cases[] = {
+        {kStart, good, TMJOIN | TMRESUME, 9, XAER_INVAL}, {kStart, good, TMSUCCESS, 9, XAER_INVAL},
+        {kStart, good, TMASYNC, 9, XAER_ASYNC},           {kStart, good, TMNOFLAGS, 9, XAER_PROTO},
+        {kStart, Named("", "b"), 0, 1, XAER_INVAL},       {kStart, {-1, 1, 1, "gb"}, 0, 1, XAER_INVAL},
+        {kStart, {9, 65, 0, {}}, 0, 1, XAER_INVAL},       {kStart, {9, 1, 65, {}}, 0, 1, XAER_INVAL},
+        {kStart, {9, 1, -1, {}}, 0, 1, XAER_INVAL},       {kEnd, good, TMNOFLAGS, 1, XAER_INVAL},
+        {kEnd, good, TMSUCCESS | TMFAIL, 1, XAER_INVAL},  {kEnd, good, TMSUCCESS | TMMIGRATE, 1, XAER_INVAL},
+        {kPrepare, good, TMONEPHASE, 1, XAER_INVAL},      {kCommit, good, TMFAIL, 1, XAER_INVAL},
+        {kCommit, good, TMONEPHASE | TMNOWAIT, 1, XAER_NOTA}, {kForget, good, TMNOFLAGS, 9, XAER_PROTO},
+        {kRollback, good, TMASYNC, 1, XAER_ASYNC},
+    };
+    for (const auto& c : cases) EXPECT_EQ(Call(c.entry, c.xid, c.flags, c.rmid), c.code) << &c - cases;
+    const XID longest = Named(std::string(64, 'g'), std::string(64, 'b'));
+    EXPECT_EQ(Call(kStart, longest, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(Call(kEnd, longest, TMSUCCESS), XA_OK);
+    EXPECT_EQ(Call(kPrepare, longest, TMNOFLAGS), XA_RDONLY);
+    for (const auto entry : {kStart, kEnd, kPrepare, kCommit, kRollback, kForget})
+        EXPECT_EQ((rmXaSwitch.*entry)(nullptr, 1, entry == kEnd ? TMSUCCESS : TMNOFLAGS), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, 1, 1, TMSTARTRSCAN), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, -1, 1, TMSTARTRSCAN), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, 0, 1, TMSTARTRSCAN), 0);
+    EXPECT_EQ(rmXaSwitch.xa_complete_entry(nullptr, nullptr, 1, TMNOFLAGS), XAER_INVAL);
+    EXPECT_EQ(XaGetInfo(1, nullptr), XAER_INVAL);
+    SQLCA unused;
+    EXPECT_EQ(XaGetInfo(77, &unused), XAER_INVAL);
+}
+
+TEST_F(XaCalls, InfoStrings) {
+    const struct { const char* info; int code; } cases[] = {
+        {"", XA_OK}, {"KELP_XA", XA_OK}, {"KELP_XA+db=three+MAXCUR=3+LogDir=/tmp+sestm=0+threads=FALSE", XA_OK},
+        {"SqlNet=three+Acc=P//", XA_OK}, {"DB=one", XAER_INVAL}, {"DB=", XAER_INVAL}, {"DB=x+", XAER_INVAL},
+        {"DB=x+word", XAER_INVAL}, {"DB=x+db=y", XAER_INVAL}, {"Acc=P/u", XAER_INVAL}, {"Acc=P//p", XAER_INVAL},
+        {"Acc=P/u/", XAER_INVAL}, {"Acc=u/p", XAER_INVAL}, {"SesTm=", XAER_INVAL}, {"SesTm=-1", XAER_INVAL},
+        {"SesTm=5s", XAER_INVAL}, {"SesTm=4294967296", XAER_INVAL}, {"Threads=yes", XAER_INVAL},
+        {"MaxCur=x", XAER_INVAL}, {"Loose=true", XAER_INVAL}, {"SqlNet=:memory:", XAER_RMERR},
+        {"SqlNet=postgresql://127.0.0.1:1/x", XAER_RMFAIL},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(Open(3, c.info), c.code) << c.info;
+        EXPECT_EQ(xaoEnv(nullptr) != nullptr, c.code == XA_OK && !std::strstr(c.info, "db=")) << c.info;
+        EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
+    }
+    EXPECT_EQ(Open(3, "DB=" + std::string(MAXINFOSIZE - 3, 'x')), XAER_INVAL);
+    // Of several without a name none is the one.
+    EXPECT_EQ(Open(3, "SqlNet=three"), XA_OK);
+    EXPECT_EQ(Open(4, "SqlNet=four"), XA_OK);
+    EXPECT_EQ(xaoSvcCtx(nullptr), nullptr);
+    for (const int rmid : {3, 4}) EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, rmid, TMNOFLAGS), XA_OK);
+}
+
+TEST_F(XaCalls, ScansGoOnWhereTheyWere) {
+    for (const char* name : {"a", "b"}) {    // one file has one writer: a branch that has prepared keeps it
+        const XID xid = Named("scan", name);
+        EXPECT_EQ(Call(kStart, xid, TMNOFLAGS), XA_OK);
+        EXPECT_EQ(Change(), *name == 'a' ? 0 : 54) << name;
+        EXPECT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK);
+        EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), *name == 'a' ? XA_OK : XA_RDONLY);
+    }
+    XID found[2] = {};
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(found, 2, 1, TMNOFLAGS), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(found, 2, 1, TMSTARTRSCAN), 1);
+    const XID expected = Named("scan", "a");
+    EXPECT_EQ(std::memcmp(found, &expected, sizeof expected), 0);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(found, 2, 1, TMENDRSCAN), 0);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(found, 2, 1, TMENDRSCAN), XAER_INVAL);
+    EXPECT_EQ(Recovered(2), 0);
+    EXPECT_EQ(Call(kRollback, expected, TMNOFLAGS), XA_OK);
+}
+
+// A database has its own branch of a name; who waits for a busy one gets it, or is told to try again.
+TEST_F(XaCalls, ThreadsOfControl) {
+    const XID xid = Named("threads", "x");
+    ASSERT_EQ(Call(kStart, xid, TMNOFLAGS), XA_OK);
+    ASSERT_EQ(Change(), 0);
+    EXPECT_EQ(Call(kStart, xid, TMNOFLAGS, 2), XA_OK);
+    EXPECT_EQ(Call(kEnd, xid, TMSUCCESS, 2), XA_OK);
+    EXPECT_EQ(Call(kCommit, xid, TMONEPHASE, 2), XA_OK);
+    std::promise<void> waits;
+    std::thread other([&] {
+        EXPECT_EQ(Open(5, "SqlNet=one+Threads=true"), XA_OK);
+        EXPECT_EQ(Call(kStart, xid, TMJOIN | TMNOWAIT, 5), XA_RETRY);
+        EXPECT_EQ(Call(kStart, xid, TMRESUME, 9), XAER_PROTO);
+        waits.set_value();
+        EXPECT_EQ(Call(kStart, xid, TMJOIN, 5), XA_OK);
+        EXPECT_EQ(Call(kEnd, xid, TMSUSPEND | TMMIGRATE, 5), XA_OK);
+        EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 5, TMNOFLAGS), XA_OK);
+    });
+    waits.get_future().wait();
+    EXPECT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK);
+    other.join();
+    EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS, 5), XAER_PROTO) << "the other thread's";
+    EXPECT_EQ(Call(kStart, xid, TMRESUME), XA_OK);
+    EXPECT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK);
+    EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(Call(kCommit, xid, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(Run("one", "insert into t select 1 / (case count(*) when 1 then 1 else 0 end) from t"), 0);
+    EXPECT_EQ(OCITransCommit(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT), OCI_SUCCESS);
+}
+
+// The other manager's change waits for the lock of the branch that rests, and gets it when its time is over.
+TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
+    ASSERT_EQ(Open(3, "SqlNet=one+SesTm=1"), XA_OK);
+    const XID xid = Named("time", "x");
+    ASSERT_EQ(Call(kStart, xid, TMNOFLAGS, 3), XA_OK);
+    EXPECT_EQ(Run(nullptr, "insert into t values(1)"), 0);
+    ASSERT_EQ(Call(kEnd, xid, TMSUCCESS, 3), XA_OK);
+    EXPECT_EQ(Change(), 0);
+    EXPECT_EQ(OCITransRollback(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT), OCI_SUCCESS);
+    EXPECT_EQ(Call(kStart, xid, TMJOIN, 3), XA_RBTIMEOUT);
+    EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_RBTIMEOUT);
+    EXPECT_EQ(Code(), -2049);
+    EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
+}
+
+}  // namespace
