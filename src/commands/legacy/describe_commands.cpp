@@ -123,9 +123,9 @@ sword Describe(Lda_Def* login, const TextArgument& object, Arrays& arrays, ub4& 
 
 void DescribeProcedure(const CommandRow& row, int count, char** words) {
     constexpr ub2 kNameLength = 30;
+    const AreaArgument login = ResolveArea(Kind::ldainfo, words[1]);
     const ub4 asked = DecodeCount(words[4]);
     if (asked > kMostArguments) return Message(kError, "Can't do more than 100 in tool\n");
-    const AreaArgument login = ResolveArea(Kind::ldainfo, words[1]);
     TextArgument object;
     const Memory<Arrays> arrays(static_cast<Arrays*>(GetMem(sizeof(Arrays))));
     if (arrays == nullptr || !SetAreaText(object, words + 2)) return;

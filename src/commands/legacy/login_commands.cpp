@@ -15,19 +15,16 @@ namespace {
 // --- Logins that a command makes -------------------------------------------------------------------------------------
 
 struct LoginMaker : CommandRow {
-    int name;   // the word that names the login
-    int error;  // the word of the error handle that is asked for records; 0: the report is that of areas
     // Nothing when the command ends here, which has been said.
     std::optional<sword> (*call)(NewArea& login, char** words);
 };
 
 void RunLoginMaker(const LoginMaker& row, int, char** words) {
-    NewArea login(Kind::ldainfo, words[row.name]);
+    NewArea login(Kind::ldainfo, words[1]);
     if (!login.Make()) return;
     const std::optional<sword> rc = row.call(login, words);
     if (!rc) return;
-    if (row.error != 0) TraceAndReport(row.code, words[1], ResolveError<OCIError>(words[row.error]), *rc);
-    else TraceAndReportAreas(row.code, words[1], {.login = login.Area(), .shown = login.Area()}, *rc);
+    TraceAndReportAreas(row.code, words[1], {.login = login.Area(), .shown = login.Area()}, *rc);
     if (*rc == OCI_SUCCESS) login.Enter(nullptr);
 }
 
@@ -69,30 +66,33 @@ std::optional<sword> AdoptNamedConnection(NewArea& login, char** words) {
     return ResultIn(&ClientLibrary::sqlld2, login.Area());
 }
 
-std::optional<sword> LendServiceContext(NewArea& login, char** words) {
-    auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
-    auto* const error = ResolveError<OCIError>(words[2]);
-    return Call(&ClientLibrary::OCISvcCtxToLda, svc, error, login.Area());
-}
-
 constexpr LoginMaker kLoginMakers[] = {
     {{Code::olog, Words(10),
       "olog lda hda username username_len password password_len database database_len mode"},
-     1, 0, LogOn},
-    {{Code::sqllda, Words(2), "sqllda lda"}, 1, 0, AdoptConnection},
-    {{Code::sqlld2, Words(4), "sqlld2 lda dbname dbname_len"}, 1, 0, AdoptNamedConnection},
-    {{Code::ocisvcctxtolda, Words(4), "OCISvcCtxToLda hSvc hError lda"}, 3, 2, LendServiceContext},
+     LogOn},
+    {{Code::sqllda, Words(2), "sqllda lda"}, AdoptConnection},
+    {{Code::sqlld2, Words(4), "sqlld2 lda dbname dbname_len"}, AdoptNamedConnection},
 };
 
-// --- A login that becomes a service context --------------------------------------------------------------------------
+// --- A service context that becomes a login, and the way back --------------------------------------------------------
+
+void LendServiceContext(const CommandRow& row, int, char** words) {
+    NewArea login(Kind::ldainfo, words[3]);
+    if (!login.Make()) return;
+    auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
+    auto* const error = ResolveError<OCIError>(words[2]);
+    const sword rc = Call(&ClientLibrary::OCISvcCtxToLda, svc, error, login.Area());
+    TraceAndReport(row.code, words[1], error, rc);
+    if (rc == OCI_SUCCESS) login.Enter(nullptr);
+}
 
 // A name in use hands over its service context and stays as it is.
 void TakeBackServiceContext(const CommandRow& row, int, char** words) {
-    const AreaArgument login = ResolveArea(Kind::ldainfo, words[3]);
     NewObject<OCISvcCtx> svc(words[1]);
     const NamedObject* const held = FindByName(Kind::svc, words[1]);
     if (held != nullptr) svc.Hand(static_cast<OCISvcCtx*>(held->object));
     auto* const error = ResolveError<OCIError>(words[2]);
+    const AreaArgument login = ResolveArea(Kind::ldainfo, words[3]);
     const sword rc = Call(&ClientLibrary::OCILdaToSvcCtx, svc.Place(), error, login.area);
     TraceAndReport(row.code, words[3], error, rc);
     if (rc != OCI_SUCCESS) return;
@@ -132,6 +132,7 @@ void Initialise(const CommandRow& row, int, char** words) {
 }
 
 constexpr PlainCommand kPlainCommands[] = {
+    {{Code::ocisvcctxtolda, Words(4), "OCISvcCtxToLda hSvc hError lda"}, LendServiceContext},
     {{Code::ocildatosvcctx, Words(4), "OCILdaToSvcCtx hSvc hError lda"}, TakeBackServiceContext},
     {{Code::oopen, Words(3, 8), "oopen cda lda [database database_len areasize username username_len]"}, OpenCursor},
     {{Code::oermsg, Words(2, 3), "oermsg code [buf]"}, ShowText},
