@@ -105,17 +105,6 @@ Status StartLocal(Link& link, const StartRequest& request) {
     return {};
 }
 
-Status StartBranch(Link& link, const engine::Xid& xid, const StartRequest& request, std::uint32_t timeout) {
-    Branches& branches = Branches::Process();
-    BranchPointer held;
-    Status status = branches.Create({IdentityOf(link.Database()), xid}, link.user, request.coupling,
-                                    std::chrono::seconds(timeout), held);
-    if (!status.Ok()) return status;
-    status = TakeUp(link, held, Family::calls, request.mode);
-    if (!status.Ok()) branches.Remove(held, 0);
-    return status;
-}
-
 Status Resume(Link& link, const engine::Xid& xid, std::uint32_t timeout) {
     BranchPointer held;
     if (Status status = HoldNamed(link, xid, std::chrono::seconds(timeout), held); !status.Ok()) return status;
@@ -126,7 +115,7 @@ Status Resume(Link& link, const engine::Xid& xid, std::uint32_t timeout) {
         Status rolled_back = RollBack(hold);
         return rolled_back.Ok() ? Error(errors::kBranchRolledBack) : rolled_back;
     }
-    Status status = TakeUp(link, held, Family::calls, engine::TransactionMode::read_write);
+    Status status = TakeUp(link, held, Family::calls);
     if (status.Ok()) hold.Over();
     return status;
 }
@@ -142,7 +131,8 @@ Status Start(ServiceContext& service, Link& link, std::uint32_t timeout, std::ui
     if (link.InLocalTransaction()) return Error(errors::kTransactionActive);
     Status status = !name             ? StartLocal(link, request)
                     : request.resumes ? Resume(link, *name, timeout)
-                                      : StartBranch(link, *name, request, timeout);
+                                      : Begin(link, {*name, request.coupling, std::chrono::seconds(timeout), request.mode},
+                                               Family::calls);
     if (!status.Ok() || !request.separable) return status;
     return Warning(errors::kFlagsUnsupported, "the transaction is not separated after each call");
 }

@@ -118,14 +118,27 @@ Status WorkingBranch::Check(bool in_transaction) {
     return branch_->work->doom == 0 ? Status() : Error(errors::kBranchRolledBack);
 }
 
-Status TakeUp(Link& link, const BranchPointer& held, Family family, engine::TransactionMode mode) {
-    auto working = std::make_unique<WorkingBranch>(held, family);
-    if (mode != engine::TransactionMode::read_write) {
-        if (Status status = link.Engine().Begin(mode); !status.Ok()) {
-            (void)working->Take();
+// What is not begun to its end goes with `working`.
+Status Begin(Link& link, const NewBranch& branch, Family family) {
+    auto working = std::make_unique<WorkingBranch>(nullptr, family);
+    BranchPointer held;
+    Status status = Branches::Process().Create({IdentityOf(link.Database()), branch.xid}, link.user, branch.coupling,
+                                               branch.timeout, held);
+    if (!status.Ok()) return status;
+    working->Set(held);
+    if (branch.mode != engine::TransactionMode::read_write && !held->work->connection) {
+        if (status = link.Engine().Begin(branch.mode); !status.Ok()) {
+            Branches::Process().Remove(working->Take(), 0);
             return status;
         }
     }
+    if (held->work->connection) KeepSpare(link, *held, link.Exchange(std::move(held->work->connection)));
+    link.branch = std::move(working);
+    return {};
+}
+
+Status TakeUp(Link& link, const BranchPointer& held, Family family) {
+    auto working = std::make_unique<WorkingBranch>(held, family);
     if (held->work->connection) KeepSpare(link, *held, link.Exchange(std::move(held->work->connection)));
     link.branch = std::move(working);
     return {};

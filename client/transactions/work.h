@@ -22,6 +22,7 @@ public:
     Status Check(bool in_transaction) override;
     [[nodiscard]] const BranchPointer& Get() const { return branch_; }
     [[nodiscard]] Family GetFamily() const { return family_; }
+    void Set(BranchPointer branch) noexcept { branch_ = std::move(branch); }
     BranchPointer Take() noexcept { return std::move(branch_); }    // it goes on without the session
 
 private:
@@ -50,8 +51,15 @@ private:
     bool over_ = false;
 };
 
-// The session, in no transaction of its own, takes a held branch up.
-Status TakeUp(Link& link, const BranchPointer& held, Family family, engine::TransactionMode mode);
+// The session, in no transaction of its own, begins a new branch, or takes a held one up.
+struct NewBranch {
+    engine::Xid xid;
+    Coupling coupling;
+    std::chrono::seconds timeout;
+    engine::TransactionMode mode;
+};
+Status Begin(Link& link, const NewBranch& branch, Family family);
+Status TakeUp(Link& link, const BranchPointer& held, Family family);
 // The session leaves the branch that it works in. On failure it still works in it: 24782 where the database has one
 // connection.
 Status Leave(Link& link, Rest rest);

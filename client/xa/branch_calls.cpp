@@ -84,14 +84,10 @@ Answer HoldAtRest(const Call& call, BranchPointer& held) {
 // ---- Associations
 
 Answer StartNew(const Call& call) {
-    Link& link = call.GetLink();
-    BranchPointer held;
-    Status status = Branches::Process().Create(call.Key(), link.user, transactions::Coupling::loose,
-                                               call.manager->GetInfo().session_timeout, held);
-    if (!status.Ok()) return AnswerOf(std::move(status));
-    status = transactions::TakeUp(link, held, Family::xa, engine::TransactionMode::read_write);
-    if (!status.Ok()) Branches::Process().Remove(held, 0);
-    return AnswerOf(std::move(status));
+    const transactions::NewBranch branch{call.xid, transactions::Coupling::loose,
+                                         call.manager->GetInfo().session_timeout,
+                                         engine::TransactionMode::read_write};
+    return AnswerOf(transactions::Begin(call.GetLink(), branch, Family::xa));
 }
 
 Answer TakeUpAgain(const Call& call, xa_long flags) {
@@ -104,7 +100,7 @@ Answer TakeUpAgain(const Call& call, xa_long flags) {
     if (flags & TMRESUME ? !resumable : held->rest != Rest::idle) return XAER_PROTO;
     if (held->user != call.GetLink().user) return {XAER_RMERR, Error(errors::kOtherUsersBranch)};
     if (held->work->doom != 0) return AnswerOf(Error(held->work->doom));
-    status = transactions::TakeUp(call.GetLink(), held, Family::xa, engine::TransactionMode::read_write);
+    status = transactions::TakeUp(call.GetLink(), held, Family::xa);
     if (status.Ok()) hold.Over();
     return AnswerOf(std::move(status));
 }

@@ -308,7 +308,35 @@ void PoolSessions(World& w) {
     w.See(w.Attribute<ub4>(OCI_ATTR_SPOOL_BUSY_COUNT, pool, OCI_HTYPE_SPOOL));
 }
 
+// A branch that is left, taken up, prepared and committed. Whatever fails, what is left of it can be rolled back.
+void Branches(World& w) {
+    LogOn(w, "", "", w.Folder() + "/branches.db");
+    w.stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
+    w.Run("create table if not exists b(n number)");
+    w.Run("delete from b");
+    w.Run("commit");
+    auto* const trans = w.New<OCITrans>(OCI_HTYPE_TRANS);
+    XID xid{5, 2, 1, "txb"};
+    w.STEP(OCIAttrSet, trans, OCI_HTYPE_TRANS, &xid, sizeof xid, OCI_ATTR_XID, w.err);
+    w.STEP(OCIAttrSet, w.svc, OCI_HTYPE_SVCCTX, trans, 0, OCI_ATTR_TRANS, w.err);
+    w.AtEnd([&w] {
+        const sword code = OCITransRollback(w.svc, w.err, OCI_DEFAULT);
+        return World::Number(w.err, OCI_HTYPE_ERROR) == 24756 ? OCI_SUCCESS : code;    // there is none
+    });
+    w.STEP(OCITransStart, w.svc, w.err, 0, OCI_TRANS_NEW);
+    w.Run("insert into b values(1)");
+    w.STEP(OCITransDetach, w.svc, w.err, OCI_DEFAULT);
+    w.STEP(OCITransStart, w.svc, w.err, 0, OCI_TRANS_RESUME);
+    w.Run("insert into b values(2)");
+    w.STEP(OCITransPrepare, w.svc, w.err, OCI_DEFAULT);
+    w.STEP(OCITransCommit, w.svc, w.err, OCI_TRANS_TWOPHASE);
+    w.Run("update b set n = n");
+    w.See(w.Attribute<ub4>(OCI_ATTR_ROW_COUNT));
+    w.STEP(OCITransRollback, w.svc, w.err, OCI_DEFAULT);
+}
+
 constexpr Scenario kScenarios[] = {
+    {"Branches", Ground::environment, nullptr, Branches, "2;"},
     {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;", OCI_DEFAULT, true},
     {"FromNothingThreaded", Ground::nothing, nullptr, FromNothing, "abc;", OCI_THREADED | OCI_OBJECT},
     {"InitializeAndLogOn2", Ground::nothing, nullptr, InitializeAndLogOn2, "20;"},
