@@ -42,11 +42,13 @@ Status PgConnection::Stopped() { return Refused(errors::kCancelled); }
 Status PgConnection::Enter() {
     if (wire_->Broken()) return wire_->Lost();
     if (streaming_) streaming_->ReadAhead();
-    if (forgotten_.size() < kForgottenAtOnce) return wire_->Broken() ? wire_->Lost() : Status();
-    for (const std::string& name : forgotten_) wire_->Send(("deallocate " + name).c_str());
+    const bool forgets = forgotten_.size() >= kForgottenAtOnce && !in_transaction_;    // a failure would end it
+    if (!forgets) return wire_->Broken() ? wire_->Lost() : Status();
+    for (const std::string& command : forgotten_) wire_->Send(command.c_str());
     wire_->Sync();
     forgotten_.clear();
-    return wire_->Drain();
+    (void)wire_->Drain();
+    return wire_->Broken() ? wire_->Lost() : Status();
 }
 
 Status PgConnection::Enter(Effect effect) {
@@ -132,7 +134,7 @@ std::string PgConnection::NewName() { return "kelp_" + std::to_string(++names_);
 
 // There is nothing to be done about a name that no memory is left for: it stays with the server until the session ends.
 void PgConnection::Forget(const std::string& name) noexcept try {
-    if (!name.empty() && !wire_->Broken()) forgotten_.push_back(name);
+    if (!name.empty() && !wire_->Broken()) forgotten_.push_back("deallocate " + name);
 } catch (const std::bad_alloc&) {
 }
 

@@ -112,7 +112,7 @@ private:
     };
     std::vector<Savepoint> savepoints_;    // from the outermost
     unsigned marks_ = 0;
-    std::vector<std::string> forgotten_;     // prepared statements that nobody has any more
+    std::vector<std::string> forgotten_;     // commands that end prepared statements which nobody has any more
     std::uint64_t names_ = 0;
     std::map<Oid, std::vector<bool>> not_null_;
     PgQuery* streaming_ = nullptr;

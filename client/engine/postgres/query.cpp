@@ -50,6 +50,16 @@ bool Failed(const PGresult* result) { return PQresultStatus(result) == PGRES_FAT
 
 Status NoMemory() { return Refused(errors::kOutOfMemory); }
 
+// Whether two more failures can be noted: one, and that there is no room for others.
+bool HasRoom(std::vector<ArrayOutcome::Failure>& failures) noexcept {
+    try {
+        if (failures.capacity() - failures.size() < 2) failures.reserve(2 * failures.size() + 2);
+        return true;
+    } catch (const std::bad_alloc&) {
+        return false;
+    }
+}
+
 }  // namespace
 
 PgQuery::PgQuery(PgConnection& connection, const StatementSource& source)
@@ -123,11 +133,12 @@ Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_of
     connection_.Forget(name_);
     connection_.Forget(std::exchange(whole_name_, {}));
     whole_ = Whole::unknown;
-    name_ = connection_.NewName();
+    name_.clear();
+    std::string name = connection_.NewName();
+    const std::string text = sql_ + std::string(tail_);
     const PgConnection::Guard guard = connection_.SendGuard(false);
-    server.SendPrepare(name_.c_str(), sql_.append(tail_).c_str(), types);
-    sql_.resize(sql_.size() - tail_.size());
-    server.SendDescribe(name_.c_str());
+    server.SendPrepare(name.c_str(), text.c_str(), types);
+    server.SendDescribe(name.c_str());
     connection_.SendRelease(guard);
     Status status = connection_.PassGuard(guard);
     Result description;
@@ -142,9 +153,9 @@ Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_of
     }
     Status rest = server.Drain();
     status = connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
-    if (status.Ok()) return Describe(description.get());
-    name_.clear();
-    return status;
+    if (!status.Ok()) return status;
+    name_ = std::move(name);
+    return Describe(description.get());
 }
 
 // Throws before anything is changed, or the query is none.
@@ -265,8 +276,8 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         Batch batch;
         const bool whole = row >= singly && row < stop && !delivers && stop == run.last && PrepareWhole(run.last - row);
         if (whole) {
-            batch = RunWhole(source, row, run.last);
-            singly = row + batch.sent;
+            batch = TryWhole(source, row, run.last);
+            singly = row + std::max(batch.sent, 1U);
             if (batch.refusal.Number() == errors::kCancelled) stop = singly;
             if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !connection_.Broken()) continue;
         } else if (row == stop) batch.refusal = PgConnection::Stopped();
@@ -292,8 +303,10 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         const bool stops = !run.all_rows || failure.Number() == errors::kCancelled;
         outcome.failures.push_back({row, std::move(failure)});
         if (stops) break;
-        outcome.failures.reserve(outcome.failures.size() + 2);
         ++row;
+        if (HasRoom(outcome.failures)) continue;
+        if (row < run.last) outcome.failures.push_back({row, NoMemory()});
+        break;
     }
     return {};
 }

@@ -74,6 +74,8 @@ private:
     void AppendRow();
     Wire::Values FinishArrays(std::uint32_t rows);
     Batch RunWhole(RowSource& source, std::uint32_t first, std::uint32_t last);
+    Batch TryWhole(RowSource& source, std::uint32_t first, std::uint32_t last) noexcept;
+    bool MakeWhole();
     void ReadBatch(Batch& batch) noexcept;
     Batch RunReturning(RowSource& source, std::uint32_t row, RowSink& sink);
     Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);
@@ -90,7 +92,7 @@ private:
     Status Fill(const PGresult* result, int row);
 
     PgConnection& connection_;
-    std::string sql_;
+    const std::string sql_;
     const Effect effect_;
     const Verb verb_;
     const std::vector<Kind> kinds_;

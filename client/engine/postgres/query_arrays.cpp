@@ -2,8 +2,10 @@
 // the server takes twice as fast as single ones. What fails there is done again row by row: it knows which one fails.
 #include <algorithm>
 #include <cstdlib>
+#include <new>
 
 #include "engine/postgres/query.h"
+#include "handles/errors.h"
 
 namespace engine::postgres {
 namespace {
@@ -56,11 +58,19 @@ bool IsPlaceholdersAlone(std::string_view text, std::size_t count) {
 
 }  // namespace
 
-// Has the server prepare the statement over arrays, once.
 bool PgQuery::PrepareWhole(std::uint32_t rows) {
     if (rows < kFewestRows || whole_ == Whole::impossible) return false;
     if (whole_ == Whole::ready) return true;
     whole_ = Whole::impossible;
+    try {
+        return MakeWhole();
+    } catch (const std::bad_alloc&) {
+        return false;
+    }
+}
+
+// Has the server prepare the statement over arrays, once.
+bool PgQuery::MakeWhole() {
     const std::vector<Oid>& types = bound_.Types();
     std::string lower = sql_;
     for (char& c : lower) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
@@ -74,16 +84,17 @@ bool PgQuery::PrepareWhole(std::uint32_t rows) {
         text += (index > 0 ? ", $" : "$") + std::to_string(index + 1) + "::" + element->array;
     }
     text += ')';
-    whole_name_ = connection_.NewName();
+    std::string name = connection_.NewName();
     Wire& server = connection_.Server();
     const PgConnection::Guard guard = connection_.SendGuard(false);
-    server.SendPrepare(whole_name_.c_str(), text.c_str(), {});
+    server.SendPrepare(name.c_str(), text.c_str(), {});
     connection_.SendRelease(guard);
     Status status = connection_.PassGuard(guard);
     Status rest = server.Drain();
-    if (!connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status)).Ok()) whole_name_.clear();
-    else whole_ = Whole::ready;
-    return whole_ == Whole::ready;
+    if (!connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status)).Ok()) return false;
+    whole_name_ = std::move(name);
+    whole_ = Whole::ready;
+    return true;
 }
 
 void PgQuery::AppendRow() {
@@ -146,6 +157,17 @@ PgQuery::Batch PgQuery::RunWhole(RowSource& source, std::uint32_t first, std::ui
     batch.failure = connection_.Settle(guard, std::move(batch.failure));
     batch.done = 0;
     return batch;
+}
+
+// Short of memory before anything was sent: single rows need less.
+PgQuery::Batch PgQuery::TryWhole(RowSource& source, std::uint32_t first, std::uint32_t last) noexcept {
+    try {
+        return RunWhole(source, first, last);
+    } catch (const std::bad_alloc&) {
+        Batch none;
+        none.failure = Refused(errors::kOutOfMemory);
+        return none;
+    }
 }
 
 }  // namespace engine::postgres
