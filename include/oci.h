@@ -7,6 +7,7 @@
 #include "oci_constants.h"
 #include "oci_attributes.h"
 #include "oci_functions.h"
+#include "oci_failover.h"
 #include "oci_values.h"
 #include "oci_services.h"
 #include "oci_legacy.h"

@@ -111,6 +111,7 @@
 #define SQLT_LVB 95             /* address of an OCIRaw * */
 #define SQLT_AFC 96             /* characters, padded with blanks */
 #define SQLT_AVC 97             /* ub2 length, then characters; trailing blanks kept */
+#define SQLT_AFV 97             /* another name of it */
 #define SQLT_IBFLOAT 100        /* canonical float */
 #define SQLT_IBDOUBLE 101       /* canonical double */
 #define SQLT_CUR 102            /* address of an OCIStmt * */
@@ -151,6 +152,27 @@
 #define OCI_UCS2ID 1000
 #define OCI_TYPECODE_VARRAY 247
 #define OCI_TYPECODE_TABLE 248
+#define OCI_TYPECODE_OBJECT 108
+#define OCI_TYPECODE_NAMEDCOLLECTION 122
+#define OCI_TYPECODE_SMALLINT 246
+#define OCI_TYPECODE_INTEGER 3
+#define OCI_TYPECODE_NUMBER SQLT_NUM
+#define OCI_TYPECODE_FLOAT 4
+#define OCI_TYPECODE_BFLOAT SQLT_IBFLOAT
+#define OCI_TYPECODE_BDOUBLE SQLT_IBDOUBLE
+#define OCI_TYPECODE_VARCHAR SQLT_CHR
+#define OCI_TYPECODE_VARCHAR2 9
+#define OCI_TYPECODE_CHAR SQLT_AFC
+#define OCI_TYPECODE_RAW SQLT_LVB
+#define OCI_TYPECODE_DATE SQLT_DAT
+#define OCI_TYPECODE_TIMESTAMP SQLT_TIMESTAMP
+#define OCI_TYPECODE_TIMESTAMP_TZ SQLT_TIMESTAMP_TZ
+#define OCI_TYPECODE_TIMESTAMP_LTZ SQLT_TIMESTAMP_LTZ
+#define OCI_TYPECODE_INTERVAL_YM SQLT_INTERVAL_YM
+#define OCI_TYPECODE_INTERVAL_DS SQLT_INTERVAL_DS
+#define OCI_TYPECODE_BLOB SQLT_BLOB
+#define OCI_TYPECODE_CLOB SQLT_CLOB
+#define OCI_TYPECODE_BFILE SQLT_BFILE
 
 /* Environment modes. */
 #define OCI_THREADED 0x1

@@ -27,6 +27,31 @@ typedef long sbig_ora;  /* file lengths and offsets */
 typedef unsigned long ubig_ora;
 typedef int boolean;         /* TRUE or FALSE */
 typedef unsigned char text;  /* also UTF-16 data; lengths are in bytes even then */
+typedef ub2 utext;           /* a unit of UTF-16 data */
+
+/* The ends of the scalar types. */
+#define UB1MINVAL ((ub1)0)
+#define UB1MAXVAL ((ub1)255)
+#define SB1MINVAL ((sb1)-128)
+#define SB1MAXVAL ((sb1)127)
+#define UB2MINVAL ((ub2)0)
+#define UB2MAXVAL ((ub2)65535)
+#define SB2MINVAL ((sb2)-32768)
+#define SB2MAXVAL ((sb2)32767)
+#define UB4MINVAL ((ub4)0)
+#define UB4MAXVAL ((ub4)4294967295u)
+#define SB4MINVAL ((sb4)(-2147483647 - 1))
+#define SB4MAXVAL ((sb4)2147483647)
+#define UB8MINVAL ((ub8)0)
+#define UB8MAXVAL ((ub8)UINT64_MAX)
+#define SB8MINVAL ((sb8)INT64_MIN)
+#define SB8MAXVAL ((sb8)INT64_MAX)
+#define UWORDMINVAL ((uword)0)
+#define UWORDMAXVAL ((uword)4294967295u)
+#define SWORDMINVAL ((sword)(-2147483647 - 1))
+#define SWORDMAXVAL ((sword)2147483647)
+#define EWORDMINVAL ((eword)(-2147483647 - 1))
+#define EWORDMAXVAL ((eword)2147483647)
 typedef text OraText;
 typedef text oratext;
 typedef void dvoid;

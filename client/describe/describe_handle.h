@@ -1,8 +1,8 @@
 // Describe handles: the description of one object at a time. Its parameters hang below the description, which goes with
 // the handle, or when the handle is used to describe again.
 //
-// Threads: calls on the handle and on its parameters take turns by the handle's own serial lock; no other is taken while
-// it is held.
+// Threads: calls on the handle and on its parameters take turns by the handle's own serial lock; no other is taken
+// while it is held.
 #pragma once
 
 #include <cstdint>

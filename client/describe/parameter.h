@@ -1,5 +1,5 @@
-// Parameter descriptors: what is known of a column of a select list, or of an object that was described. They hang below
-// the statement or the describe handle that they came from; their texts stay where they are as long as that lives.
+// Parameter descriptors: what is known of a column of a select list, or of an object that was described. They hang
+// below the statement or the describe handle that they came from; their texts stay where they are as long as that lives.
 //
 // Threads: calls on a parameter hold the serial lock of what it came from.
 #pragma once

@@ -252,6 +252,11 @@ public:
     // A name is a word or a quoted one, perhaps with its schema's and a point before it. 4043 when there is none of
     // that name and kind, 942 where a table or view is wanted.
     virtual Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) = 0;
+    // From now on objects without a schema's name are looked for in this one first. Answers the one in use, which stays
+    // when the name is empty. 1435 when there is none of that name, or the engine cannot prefer it.
+    virtual Status UseSchema(std::string& schema) {
+        return schema.empty() ? Status() : Error(errors::kNoSuchSchema);
+    }
     virtual LobStore* Lobs() = 0;    // null where Capabilities has no lobs
 
     virtual Status Ping() = 0;

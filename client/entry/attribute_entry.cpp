@@ -8,12 +8,13 @@ namespace {
 
 // A call that asks an error handle about itself leaves its records alone.
 template <class Body>
-sword EnterAttribute(const void* object, ub4 type, OCIError* errhp, Body&& body) noexcept {
+sword EnterAttribute(const void* object, ub4 type, OCIError* errhp, Body&& body,
+                     const char* name = __builtin_FUNCTION()) noexcept {
     const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
     Object* target = Live<Object>(object);
-    if (static_cast<const Object*>(error) != target) error->list.Clear();
+    if (static_cast<const Object*>(error) != target) error->Begin(name);
     if (!target || target->Type() != type) return OCI_INVALID_HANDLE;
     const SerialLock lock(*target);
     return Guard(error->list, [&] { return body(*target); });

@@ -34,11 +34,12 @@ sword DefineByPosition(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 positi
 
 // Steps of an array of structures, for a bind or a define.
 template <class Handle>
-sword SetSteps(const void* object, OCIError* err, ub4 value, ub4 indicator, ub4 length, ub4 code) {
+sword SetSteps(const void* object, OCIError* err, ub4 value, ub4 indicator, ub4 length, ub4 code,
+               const char* name = __builtin_FUNCTION()) {
     return Enter<Handle>(object, err, [&](Handle& handle) {
         handle.area->SetSteps(value, indicator, length, code);
         return Status();
-    });
+    }, name);
 }
 
 }  // namespace

@@ -153,9 +153,18 @@ Status VersionText(Object& object, std::string& text) {
     return {};
 }
 
+sword EnterLogOn(OCIEnv* env, OCIError* err, OCISvcCtx** out, const LogonTexts& texts, ub4 mode,
+                 const char* name = __builtin_FUNCTION()) noexcept {
+    return Enter<Environment>(env, err, [&](Environment& environment) {
+        const LongCall may_take_long;
+        return LogOn(environment, out, texts, mode);
+    }, name);
+}
+
 // Calls on the links that a service context or a server handle has; needs at least an attached server. Takes no lock:
 // OCIBreak comes from another thread while a call holds it.
-sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
+sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&),
+                 const char* name = __builtin_FUNCTION()) noexcept {
     return EnterError(errhp, [&](ErrorHandle&) -> Status {
         Object* object = LiveOneOf(handle, Kind::server, Kind::service_context);
         if (!object) return InvalidHandle();
@@ -172,22 +181,19 @@ sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&)) noexcept {
         if (!server.Attached()) return Error(errors::kNotConnected);
         for (const std::shared_ptr<Link>& link : server.Links()) act(*link);
         return {};
-    });
+    }, name);
 }
 
 }  // namespace
 
 sword OCILogon(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw,
                ub4 pwLen, const OraText* db, ub4 dbLen) {
-    return OCILogon2(env, err, svcOut, user, userLen, pw, pwLen, db, dbLen, OCI_DEFAULT);
+    return EnterLogOn(env, err, svcOut, {user, userLen, pw, pwLen, db, dbLen}, OCI_DEFAULT);
 }
 
 sword OCILogon2(OCIEnv* env, OCIError* err, OCISvcCtx** svcOut, const OraText* user, ub4 userLen, const OraText* pw,
                 ub4 pwLen, const OraText* db, ub4 dbLen, ub4 mode) {
-    return Enter<Environment>(env, err, [&](Environment& environment) {
-        const LongCall may_take_long;
-        return LogOn(environment, svcOut, {user, userLen, pw, pwLen, db, dbLen}, mode);
-    });
+    return EnterLogOn(env, err, svcOut, {user, userLen, pw, pwLen, db, dbLen}, mode);
 }
 
 sword OCILogoff(OCISvcCtx* svc, OCIError* err) {

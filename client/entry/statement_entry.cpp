@@ -47,10 +47,11 @@ Status ReleaseStatement(Statement& statement, const OraText* key, ub4 key_length
     return Release(statement, tag.View(), !(mode & OCI_STRLS_CACHE_DELETE));
 }
 
-sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode) {
+sword Fetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, sb4 offset, ub4 mode,
+            const char* name = __builtin_FUNCTION()) {
     return EnterWithError<Statement>(stmt, err, [&](Statement& statement, ErrorHandle& error) {
         return mode == OCI_DEFAULT ? statement.Fetch(error, rows, orientation, offset) : Error(errors::kBadMode);
-    });
+    }, name);
 }
 
 // A handle that a statement made serves no other, and lives no longer than it; one that the application allocated serves
@@ -64,7 +65,7 @@ Statement* StatementOf(const Handle& handle) {
 
 // Holds the statement's lock alone, which the handle's is, too, as long as it belongs to it.
 template <class Handle>
-sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece) {
+sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece, const char* name) {
     return EnterUnlocked<Handle>(object, err, [&](const Handle& handle) {
         Statement* const statement = StatementOf(handle);
         if (!statement) return Error(errors::kIllegalOperation);
@@ -72,7 +73,7 @@ sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece) {
         // Without a session there is no lock, and nothing that could wait for a piece.
         const bool locked = !statement->Env().Threaded() || statement->Serial();
         return locked ? statement->SetPieceInfo(*handle.area, piece) : Error(errors::kIllegalOperation);
-    });
+    }, name);
 }
 
 }  // namespace
@@ -165,6 +166,6 @@ sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type,
 sword OCIStmtSetPieceInfo(dvoid* hndl, ub4 type, OCIError* err, const dvoid* buf, ub4* len, ub1 piece, const dvoid* ind,
                           ub2* rcode) {
     const PieceBuffer buffer{const_cast<dvoid*>(buf), len, const_cast<dvoid*>(ind), rcode, piece, false};
-    return type == OCI_HTYPE_BIND ? SetPiece<Bind>(hndl, err, buffer)
-                                  : SetPiece<Define>(type == OCI_HTYPE_DEFINE ? hndl : nullptr, err, buffer);
+    return type == OCI_HTYPE_BIND ? SetPiece<Bind>(hndl, err, buffer, __func__)
+                                  : SetPiece<Define>(type == OCI_HTYPE_DEFINE ? hndl : nullptr, err, buffer, __func__);
 }

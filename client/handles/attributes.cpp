@@ -109,7 +109,7 @@ Status GetAttribute(Object& object, void* target, std::uint32_t* size, std::uint
 Status SetAttribute(Object& object, const void* source, std::uint32_t size, std::uint32_t attribute) {
     const AttributeRow* row = Find(object, attribute);
     if (!row || !row->set) return Error(errors::kUnknownAttribute);
-    if (row->size != 0 && size != row->size) return Error(errors::kBadValue);
+    if (row->size != 0 && size != row->size) return Error(errors::kBadAttributeSize);
     AttributeValue value;
     if (!row->looks_at_value) return row->set(object, value);
     if (row->shape == Shape::handle || row->shape == Shape::descriptor) {

@@ -1,10 +1,13 @@
 // Environments: opening, closing, memory.
 #include "handles/environment.h"
 
+#include <malloc.h>
+
 #include <cstdlib>
 #include <cstring>
 
 #include "handles/attributes.h"
+#include "handles/function_codes.h"
 #include "oci.h"
 
 namespace {
@@ -24,8 +27,15 @@ void* AllocateFrom(const MemoryFunctions& memory, std::size_t size) noexcept {
     const auto address = (reinterpret_cast<std::uintptr_t>(block) + 2 * kAlignment - 1) / kAlignment * kAlignment;
     auto** aligned = reinterpret_cast<void**>(address);
     aligned[-1] = block;
+    aligned[-2] = reinterpret_cast<void*>(size);
     std::memset(aligned, 0, size);
     return aligned;
+}
+
+// The block's bytes, as far as they are the caller's.
+std::size_t SizeOf(const MemoryFunctions& memory, void* aligned) noexcept {
+    if (!memory.allocate) return malloc_usable_size(aligned);
+    return reinterpret_cast<std::size_t>(static_cast<void**>(aligned)[-2]);
 }
 
 void ReleaseTo(const MemoryFunctions& memory, void* aligned) noexcept {
@@ -53,14 +63,18 @@ Status InUtf16(Environment& environment, AttributeValue& value) {
     return {};
 }
 
-// All memory of all environments comes from one heap, whose size nobody keeps.
-Status NoHeap(Environment&, AttributeValue&) { return {}; }
+Status HeapBytes(Environment& environment, AttributeValue& value) {
+    value.integer = environment.HeapBytes();
+    return {};
+}
+Status NoSharedHeap(Environment&, AttributeValue&) { return {}; }    // memory is each environment's own
 
 using E = Environment;
 constexpr AttributeRow kRows[] = {
+    {OCI_ATTR_FNCODE, Shape::ub4, Get<E, GetLastCall<E>>, nullptr},
     {OCI_ATTR_OBJECT, Shape::ub4, Get<E, InObjectMode>, nullptr},
-    {OCI_ATTR_HEAPALLOC, Shape::ub4, Get<E, NoHeap>, nullptr},
-    {OCI_ATTR_SHARED_HEAPALLOC, Shape::ub4, Get<E, NoHeap>, nullptr},
+    {OCI_ATTR_HEAPALLOC, Shape::ub4, Get<E, HeapBytes>, nullptr},
+    {OCI_ATTR_SHARED_HEAPALLOC, Shape::ub4, Get<E, NoSharedHeap>, nullptr},
     {OCI_ATTR_CHARSET_ID, Shape::ub2, Get<E, CharacterSet>, nullptr},
     {OCI_ATTR_NCHARSET_ID, Shape::ub2, Get<E, CharacterSet>, nullptr},
     {OCI_ATTR_ENV_UTF16, Shape::ub1, Get<E, InUtf16>, nullptr},
@@ -117,11 +131,13 @@ void* Environment::Allocate(std::size_t size) {
     void* memory = AllocateFrom(memory_, size);
     if (!memory) throw std::bad_alloc();
     held_blocks.fetch_add(1, std::memory_order_relaxed);
+    heap_bytes_.fetch_add(SizeOf(memory_, memory), std::memory_order_relaxed);
     return memory;
 }
 
 void Environment::Release(void* memory) noexcept {
     if (!memory) return;
     held_blocks.fetch_sub(1, std::memory_order_relaxed);
+    heap_bytes_.fetch_sub(SizeOf(memory_, memory), std::memory_order_relaxed);
     ReleaseTo(memory_, memory);
 }

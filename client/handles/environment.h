@@ -37,8 +37,10 @@ public:
     // Memory that lives at most as long as the environment: zeroed, 16-byte aligned, counted. Throws std::bad_alloc.
     void* Allocate(std::size_t size);
     void Release(void* memory) noexcept;    // null is harmless
+    [[nodiscard]] std::uint64_t HeapBytes() const { return heap_bytes_.load(std::memory_order_relaxed); }
 
     ErrorList errors;    // the records of calls without an error handle
+    std::atomic<const char*> last_call{nullptr};    // the name of the last of these; null: none yet
 
     // Kept for the application, without effect here.
     std::uint32_t cache_optimal_size = 8388608;
@@ -57,6 +59,7 @@ private:
     std::uint32_t mode_;
     bool utf16_;
     bool threaded_;
+    std::atomic<std::uint64_t> heap_bytes_{0};    // of what Allocate gave and Release did not get back
     MemoryFunctions memory_;
     std::mutex tree_mutex_;              // links between this environment's objects
     std::uint64_t freed_objects_ = 0;    // not destroyed yet; under the mutex of the retired objects, as the next

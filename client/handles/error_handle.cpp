@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "handles/attributes.h"
+#include "handles/function_codes.h"
 #include "handles/gate.h"
 
 namespace {
@@ -17,6 +18,7 @@ Status FirstCode(ErrorHandle& error, AttributeValue& value) {
 
 constexpr AttributeRow kRows[] = {
     {OCI_ATTR_SQLCODE, Shape::ub4, Get<ErrorHandle, FirstCode>, nullptr},
+    {OCI_ATTR_FNCODE, Shape::ub4, Get<ErrorHandle, GetLastCall<ErrorHandle>>, nullptr},
     {OCI_ATTR_DML_ROW_OFFSET, Shape::ub4, GetField<&ErrorHandle::row_offset>, nullptr},
 };
 

@@ -74,7 +74,14 @@ public:
     explicit ErrorHandle(const Origin& origin) : Object(origin) {}
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
 
+    // A call begins.
+    void Begin(const char* function) noexcept {
+        last_call.store(function, std::memory_order_relaxed);
+        list.Clear();
+    }
+
     ErrorList list;
+    std::atomic<const char*> last_call{nullptr};    // the function's name; null: none yet
     // Set by an execute and kept until the next one through this handle, not emptied by other calls.
     std::vector<RowFailure> row_failures;
     std::uint32_t row_offset = 0;    // OCI_ATTR_DML_ROW_OFFSET

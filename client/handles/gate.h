@@ -2,7 +2,8 @@
 // (null, foreign and freed pointers get OCI_INVALID_HANDLE and no record), empties the records, runs the body, turns
 // what it answers or throws into a record and the return code. Bodies answer a Status and may throw. Every pointer is
 // looked up once, and inside the call in flight: what it gives lives until the call's end, whoever frees it. What a
-// body looks up beside the gate's object is not locked by the gate.
+// body looks up beside the gate's object is not locked by the gate. The handle that records keeps the name of the
+// calling function, for OCI_ATTR_FNCODE.
 //
 //   sword OCIPing(OCISvcCtx* svchp, OCIError* errhp, ub4) {
 //       return Enter<ServiceContext>(svchp, errhp, [](ServiceContext& service) { return service.Ping(); });
@@ -53,11 +54,12 @@ sword Guard(ErrorList& list, Body&& body) noexcept {
 
 // Calls that have an object and an error handle, and need both: body(T&, ErrorHandle&).
 template <class T, class Body>
-sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept {
+sword EnterWithError(const void* object, OCIError* errhp, Body&& body,
+                     const char* name = __builtin_FUNCTION()) noexcept {
     const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
-    error->list.Clear();
+    error->Begin(name);
     T* target = Live<T>(object);
     if (!target) return OCI_INVALID_HANDLE;
     const SerialLock lock(*target);
@@ -71,38 +73,39 @@ sword EnterWithError(const void* object, OCIError* errhp, Body&& body) noexcept 
 
 // The same for bodies that answer with a status alone: body(T&).
 template <class T, class Body>
-sword Enter(const void* object, OCIError* errhp, Body&& body) noexcept {
-    return EnterWithError<T>(object, errhp, [&](T& target, ErrorHandle&) { return body(target); });
+sword Enter(const void* object, OCIError* errhp, Body&& body, const char* name = __builtin_FUNCTION()) noexcept {
+    return EnterWithError<T>(object, errhp, [&](T& target, ErrorHandle&) { return body(target); }, name);
 }
 
 // The same without the object's lock, for bodies that lock what they need themselves, in an order of their own.
 template <class T, class Body>
-sword EnterUnlocked(const void* object, OCIError* errhp, Body&& body) noexcept {
+sword EnterUnlocked(const void* object, OCIError* errhp, Body&& body,
+                    const char* name = __builtin_FUNCTION()) noexcept {
     const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
-    error->list.Clear();
+    error->Begin(name);
     T* target = Live<T>(object);
     return target ? Guard(error->list, [&] { return body(*target); }) : OCI_INVALID_HANDLE;
 }
 
 // Calls that have nothing but an error handle: body(ErrorHandle&).
 template <class Body>
-sword EnterError(OCIError* errhp, Body&& body) noexcept {
+sword EnterError(OCIError* errhp, Body&& body, const char* name = __builtin_FUNCTION()) noexcept {
     const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
-    error->list.Clear();
+    error->Begin(name);
     return Guard(error->list, [&] { return body(*error); });
 }
 
 // Calls whose first argument is an environment or a session handle: body(Environment&).
 template <class Body>
-sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
+sword EnterHandle(const void* handle, OCIError* errhp, Body&& body, const char* name = __builtin_FUNCTION()) noexcept {
     const CallInFlight call;
     ErrorHandle* error = Live<ErrorHandle>(errhp);
     if (!error) return OCI_INVALID_HANDLE;
-    error->list.Clear();
+    error->Begin(name);
     const Object* target = LiveOneOf(handle, Kind::environment, Kind::session);
     if (!target) return OCI_INVALID_HANDLE;
     return Guard(error->list, [&] { return body(target->Env()); });
@@ -110,10 +113,11 @@ sword EnterHandle(const void* handle, OCIError* errhp, Body&& body) noexcept {
 
 // Calls that have nothing but a parent environment; what goes wrong is recorded there: body(Environment&).
 template <class Body>
-sword EnterEnvironment(const void* parent, Body&& body) noexcept {
+sword EnterEnvironment(const void* parent, Body&& body, const char* name = __builtin_FUNCTION()) noexcept {
     const CallInFlight call;
     Environment* environment = Live<Environment>(parent);
     if (!environment) return OCI_INVALID_HANDLE;
+    environment->last_call = name;
     ErrorList records;
     const sword code = Guard(records, [&] { return body(*environment); });
     environment->errors.TakeFrom(records);

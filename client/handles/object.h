@@ -91,7 +91,8 @@ public:
 
     explicit SerialLock(Object& object);
     explicit SerialLock(Mutex mutex) { Lock(std::move(mutex)); }
-    SerialLock(Object& object, std::try_to_lock_t);    // waits for nothing
+    SerialLock(Object& object, std::try_to_lock_t);    // waits for nothing, as the next
+    SerialLock(Mutex mutex, std::try_to_lock_t) : mutex_(std::move(mutex)), owns_(!mutex_ || mutex_->try_lock()) {}
     ~SerialLock() { if (mutex_) Unlock(); }
     SerialLock(const SerialLock&) = delete;
     SerialLock& operator=(const SerialLock&) = delete;

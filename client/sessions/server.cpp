@@ -27,10 +27,26 @@ Status GetStatus(Server& server, AttributeValue& value) {
     return {};
 }
 
+// Before the server is attached, and of at most 30 characters.
+Status SetGroup(Server& server, const AttributeValue& value) {
+    constexpr std::size_t kLongestGroup = 30;
+    if (server.Attached()) return Error(errors::kGroupTooLate);
+    if (value.text.size() > kLongestGroup) return Error(errors::kBadValue);
+    server.group = value.text;
+    return {};
+}
+
 // A failover callback is never called: an embedded database does not fail over.
 Status TakeFailover(Object&, const AttributeValue&) { return {}; }
 
-Status GetBusy(Server&, AttributeValue&) { return {}; }    // a call that asks has the connection to itself
+// Whether a call of another thread works on a session of the server. Without threads none does.
+Status GetBusy(Server& server, AttributeValue& value) {
+    for (const std::shared_ptr<Link>& link : server.Links()) {
+        const SerialLock turn(link->Serial(), std::try_to_lock);
+        if (!turn.Owns()) value.integer = 1;
+    }
+    return {};
+}
 
 Status GetInCurrentMode(Server&, AttributeValue& value) {
     value.integer = 1;
@@ -47,7 +63,7 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_INTERNAL_NAME, Shape::text, GetText<&Server::internal_name>, SetText<&Server::internal_name>},
     {OCI_ATTR_EXTERNAL_NAME, Shape::text, GetText<&Server::external_name>, SetText<&Server::external_name>},
     {OCI_ATTR_FOCBK, Shape::handle, nullptr, TakeFailover},
-    {OCI_ATTR_SERVER_GROUP, Shape::text, GetText<&Server::group>, SetText<&Server::group>},
+    {OCI_ATTR_SERVER_GROUP, Shape::text, GetText<&Server::group>, Set<Server, SetGroup>},
     {OCI_ATTR_SERVER_STATUS, Shape::ub4, Get<Server, GetStatus>, nullptr},
     {OCI_ATTR_SERVER_BUSY, Shape::ub1, Get<Server, GetBusy>, nullptr},
     {OCI_ATTR_IN_V8_MODE, Shape::ub1, Get<Server, GetInCurrentMode>, nullptr},

@@ -1,49 +1,15 @@
 // User sessions: begin and end.
 #include "sessions/session.h"
 
+#include <strings.h>
+
 #include <optional>
 #include <utility>
 
-#include "handles/attributes.h"
 #include "handles/errors.h"
-#include "oci.h"
 #include "sessions/server.h"
 
-namespace {
-
-Status GetOpenStatements(Session& session, AttributeValue& value) {
-    const std::shared_ptr<Link> link = session.ShareLink();
-    value.integer = link ? link->open_statements : 0;
-    return {};
-}
-
-// Kept, so that applications written for it run; there is nothing here that it would choose.
-Status TakeAny(Object&, const AttributeValue&) { return {}; }
-
-using S = Session;
-constexpr AttributeRow kRows[] = {
-    {OCI_ATTR_USERNAME, Shape::text, GetText<&S::user>, SetText<&S::user>},
-    {OCI_ATTR_PASSWORD, Shape::text, nullptr, SetText<&S::password>},
-    {OCI_ATTR_NUM_OPEN_STMTS, Shape::ub4, Get<S, GetOpenStatements>, nullptr},
-    {OCI_ATTR_CLIENT_IDENTIFIER, Shape::text, nullptr, SetText<&S::client_identifier>},
-    {OCI_ATTR_MODULE, Shape::text, nullptr, SetText<&S::module>},
-    {OCI_ATTR_ACTION, Shape::text, nullptr, SetText<&S::action>},
-    {OCI_ATTR_CLIENT_INFO, Shape::text, nullptr, SetText<&S::client_info>},
-    {OCI_ATTR_DRIVER_NAME, Shape::text, nullptr, SetText<&S::driver_name>},
-    {OCI_ATTR_CONNECTION_CLASS, Shape::text, GetText<&S::connection_class>, SetText<&S::connection_class>},
-    {OCI_ATTR_CURRENT_SCHEMA, Shape::text, GetText<&S::current_schema>, SetText<&S::current_schema>},
-    {OCI_ATTR_EDITION, Shape::text, GetText<&S::edition>, SetText<&S::edition>},
-    {OCI_ATTR_PURITY, Shape::ub4, GetField<&S::purity>, SetField<&S::purity>},
-    {OCI_ATTR_MIGSESSION, Shape::handle, nullptr, TakeAny},
-    {OCI_ATTR_PROXY_CREDENTIALS, Shape::handle, nullptr, TakeAny},
-    {OCI_ATTR_INITIAL_CLIENT_ROLES, Shape::handle, nullptr, TakeAny},
-};
-
-}  // namespace
-
 Session::~Session() { Drop(); }
-
-std::span<const AttributeRow> Session::Attributes() const { return kRows; }
 
 std::shared_ptr<std::recursive_mutex> Session::Serial() { return link_.Serial(); }
 
@@ -70,7 +36,12 @@ Status Session::Begin(Server& server, const engine::Credentials& credentials) {
         std::atomic<bool>& beginning;
         ~Done() { beginning = false; }
     } const done{beginning_};
-    return ShareLink() ? Error(errors::kAlreadyAuthenticated) : Connect(server, credentials);
+    if (ShareLink()) return Error(errors::kAlreadyAuthenticated);
+    Status status = Connect(server, credentials);
+    if (status.Failed() || current_schema.empty()) return status;
+    const Status preferred = UseSchema(current_schema);
+    if (preferred.Failed()) Drop();
+    return preferred.Failed() ? preferred : status;
 }
 
 // A session that cannot join gives the connection back.
@@ -94,6 +65,22 @@ Status Session::Connect(Server& server, const engine::Credentials& credentials) 
     server_ = &server;
     link_.Set(std::move(link));
     return status;
+}
+
+// Where the user is the schema, his own is where the engine puts what he makes.
+Status Session::UseSchema(std::string schema) {
+    const Turn turn(*this);
+    if (!turn.link) return {};
+    Status status = turn.link->Engine().UseSchema(schema);
+    const bool own = status.Number() == errors::kNoSuchSchema && !schema.empty() &&
+                     strcasecmp(schema.c_str(), turn.link->user.c_str()) == 0;
+    return own ? Status() : status;
+}
+
+Status Session::GetSchema(std::string& schema) const {
+    schema = current_schema;
+    const Turn turn(*this);
+    return schema.empty() && turn.link ? turn.link->Engine().UseSchema(schema) : Status();
 }
 
 Status Session::End(GivingBack* released) {

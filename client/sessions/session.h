@@ -38,6 +38,9 @@ public:
     Status ChangePassword(const std::string& user_name, const std::string& old_password,
                           const std::string& new_password);
     void Drop() noexcept;     // rolls back; nothing when not begun
+    // Objects named without a schema are looked for there: at once, or when the session begins. 1435: it cannot be.
+    Status UseSchema(std::string schema);
+    Status GetSchema(std::string& schema) const;    // that the application wants, else the engine's
 
     std::string user;
     std::string password;

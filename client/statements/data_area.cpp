@@ -11,6 +11,12 @@
 
 namespace {
 
+// Of packed decimals; of fractions of seconds and the leading field of an interval.
+constexpr std::int16_t kLeastScale = -84;
+constexpr std::int16_t kMostScale = 127;
+constexpr std::uint64_t kMostDigits = 40;
+constexpr std::uint64_t kMostDateDigits = 9;
+
 template <class Handle>
 DataArea& AreaOf(Object& object) { return *static_cast<Handle&>(object).area; }
 
@@ -42,7 +48,9 @@ Status GetScale(Object& object, AttributeValue& value) {
 }
 template <class Handle>
 Status SetScale(Object& object, const AttributeValue& value) {
-    AreaOf<Handle>(object).workspace.scale = static_cast<std::int8_t>(value.integer);
+    const auto scale = static_cast<std::int16_t>(value.integer);
+    if (scale < kLeastScale || scale > kMostScale) return Error(errors::kBadValue);
+    AreaOf<Handle>(object).workspace.scale = static_cast<std::int8_t>(scale);
     return {};
 }
 template <class Handle>
@@ -52,8 +60,19 @@ Status GetPrecision(Object& object, AttributeValue& value) {
 }
 template <class Handle>
 Status SetPrecision(Object& object, const AttributeValue& value) {
+    if (value.integer > kMostDigits) return Error(errors::kBadValue);
     AreaOf<Handle>(object).workspace.precision = static_cast<std::uint8_t>(value.integer);
     return {};
+}
+
+template <class Handle>
+Status SetCharacterForm(Object& object, const AttributeValue& value) {
+    if (value.integer != SQLCS_IMPLICIT && value.integer != SQLCS_NCHAR) return Error(errors::kBadValue);
+    return SetArea<Handle, &DataArea::character_form>(object, value);
+}
+template <class Handle, auto member>
+Status SetDigits(Object& object, const AttributeValue& value) {
+    return value.integer <= kMostDateDigits ? SetArea<Handle, member>(object, value) : Error(errors::kBadValue);
 }
 
 Status GetRowsReturned(Object& object, AttributeValue& value) {
@@ -71,7 +90,8 @@ template <class H>
 constexpr AttributeRow kCharSet{OCI_ATTR_CHARSET_ID, Shape::ub2, GetArea<H, &DataArea::character_set>,
                                 SetCharacterSet<H>};
 template <class H>
-constexpr AttributeRow kCharForm = Kept<H, &DataArea::character_form>(OCI_ATTR_CHARSET_FORM, Shape::ub1);
+constexpr AttributeRow kCharForm{OCI_ATTR_CHARSET_FORM, Shape::ub1, GetArea<H, &DataArea::character_form>,
+                                 SetCharacterForm<H>};
 template <class H>
 constexpr AttributeRow kMostBytes = Kept<H, &DataArea::most_bytes>(OCI_ATTR_MAXDATA_SIZE, Shape::ub4);
 template <class H>
@@ -79,12 +99,23 @@ constexpr AttributeRow kMostCharacters = Kept<H, &DataArea::most_characters>(OCI
 template <class H>
 constexpr AttributeRow kPosition{OCI_ATTR_HANDLE_POSITION, Shape::ub4, GetArea<H, &DataArea::position>, nullptr};
 
-constexpr AttributeRow kDefineRows[] = {kCharCount<Define>, kScale<Define>,          kPrecision<Define>, kCharSet<Define>,
-                                        kCharForm<Define>,  kMostCharacters<Define>, kPosition<Define>};
-constexpr AttributeRow kBindRows[] = {kCharCount<Bind>, kScale<Bind>,    kPrecision<Bind>,
-                                      kCharSet<Bind>,   kCharForm<Bind>, kMostBytes<Bind>,
-                                      kMostCharacters<Bind>, kPosition<Bind>,
-                                      {OCI_ATTR_ROWS_RETURNED, Shape::ub4, GetRowsReturned, nullptr}};
+template <class H>
+constexpr AttributeRow kFraction{OCI_ATTR_FSPRECISION, Shape::ub1, GetArea<H, &DataArea::fraction_digits>,
+                                 SetDigits<H, &DataArea::fraction_digits>};
+template <class H>
+constexpr AttributeRow kLeading{OCI_ATTR_LFPRECISION, Shape::ub1, GetArea<H, &DataArea::leading_digits>,
+                                SetDigits<H, &DataArea::leading_digits>};
+
+// Two numbers mean something else for dates, times and intervals, in another width.
+template <bool datetime>
+constexpr AttributeRow kDefineRows[] = {
+    datetime ? kFraction<Define> : kScale<Define>, datetime ? kLeading<Define> : kPrecision<Define>,
+    kCharCount<Define>, kCharSet<Define>, kCharForm<Define>, kMostCharacters<Define>, kPosition<Define>};
+template <bool datetime>
+constexpr AttributeRow kBindRows[] = {
+    datetime ? kFraction<Bind> : kScale<Bind>, datetime ? kLeading<Bind> : kPrecision<Bind>,
+    kCharCount<Bind>, kCharSet<Bind>, kCharForm<Bind>, kMostBytes<Bind>, kMostCharacters<Bind>, kPosition<Bind>,
+    {OCI_ATTR_ROWS_RETURNED, Shape::ub4, GetRowsReturned, nullptr}};
 
 }  // namespace
 
@@ -162,6 +193,12 @@ void ReleaseArea(DataArea& area, const Object& statement) noexcept {
     if (handle && handle->Parent() == &statement) Destroy(handle);
 }
 
-std::span<const AttributeRow> Bind::Attributes() const { return kBindRows; }
+std::span<const AttributeRow> Bind::Attributes() const {
+    if (area->IsDatetime()) return kBindRows<true>;
+    return kBindRows<false>;
+}
 
-std::span<const AttributeRow> Define::Attributes() const { return kDefineRows; }
+std::span<const AttributeRow> Define::Attributes() const {
+    if (area->IsDatetime()) return kDefineRows<true>;
+    return kDefineRows<false>;
+}

@@ -83,6 +83,10 @@ public:
     void Leave(const StatementShare* owner) noexcept;
 
     [[nodiscard]] const values::ExternalType* Type() const { return type_; }
+    // Whether elements are descriptors of dates, times or intervals.
+    [[nodiscard]] bool IsDatetime() const {
+        return type_ && type_->family == values::Family::date && type_->is_pointer;
+    }
     [[nodiscard]] bool InPieces() const { return in_pieces_; }
     [[nodiscard]] const Callbacks& AsksBy() const { return callbacks_; }
     Status UseCharacterSet(std::uint16_t id);
@@ -98,6 +102,8 @@ public:
     std::int32_t most_bytes = 0;
     std::int32_t most_characters = 0;
     std::uint32_t character_count = 0;
+    std::uint8_t fraction_digits = 9;
+    std::uint8_t leading_digits = 9;
 
 private:
     const TypeCode handle_type_;

@@ -63,6 +63,7 @@ public:
     Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { stop_ = std::move(stop); }
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
+    Status UseSchema(std::string& schema) override;
     LobStore* Lobs() override { return nullptr; }
     Status Ping() override;
     [[nodiscard]] bool Broken() const override { return broken_; }

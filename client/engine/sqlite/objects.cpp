@@ -95,8 +95,8 @@ Status DescribeTable(sqlite3* database, const Found& found, const std::string& n
         object.index_only = sqlite3_column_int(row, 2) != 0;
     };
     return Rows(database, "select s.rowid, s.rootpage, l.wr from " + Quoted(found.schema) + ".sqlite_schema s, "
-                "pragma_table_list l where s.type in ('table', 'view') and s.name = ?1 collate nocase and l.name = s.name"
-                " and l.schema = '" + found.schema + "'", name, take);
+                "pragma_table_list l where s.type in ('table', 'view') and s.name = ?1 collate nocase and "
+                "l.name = s.name and l.schema = '" + found.schema + "'", name, take);
 }
 
 Status DescribeSchema(sqlite3* database, const std::string& name, ObjectDescription& object) {
@@ -109,8 +109,8 @@ Status DescribeSchema(sqlite3* database, const std::string& name, ObjectDescript
             object.members.push_back(TextAt(row, 0));
             object.member_kinds.push_back(TextAt(row, 1) == "view" ? ObjectKind::view : ObjectKind::table);
         };
-        status = Rows(database, "select upper(name), type from " + Quoted(schema) + ".sqlite_schema where type in ('table', "
-                      "'view') and name not like 'sqlite\\_%' escape '\\' and name <> 'kelp_accounts' order by 1",
+        status = Rows(database, "select upper(name), type from " + Quoted(schema) + ".sqlite_schema where type in "
+                      "('table', 'view') and name not like 'sqlite\\_%' escape '\\' and name <> 'kelp_accounts' order by 1",
                       {}, take);
         object.kind = ObjectKind::schema;
         object.name = Upper(schema);
@@ -160,6 +160,13 @@ Status SqliteConnection::Describe(std::string_view name, ObjectKind kind, Object
     }
     if (status.Ok()) object = std::move(described);
     return status;
+}
+
+// SQLite looks in its schemas in an order of its own, and makes everything in this one.
+Status SqliteConnection::UseSchema(std::string& schema) {
+    if (!schema.empty() && Upper(schema) != "MAIN") return Error(errors::kNoSuchSchema);
+    schema = "MAIN";
+    return {};
 }
 
 }  // namespace engine::sqlite

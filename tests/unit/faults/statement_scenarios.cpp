@@ -507,6 +507,23 @@ void DescribedColumns(World& w) {
     w.See({reinterpret_cast<char*>(names[1]), lengths[1]});
 }
 
+// An object, its list and a member, in UTF-16; a description that fails leaves none behind, and the handle serves anew.
+void DescribeTable(World& w) {
+    auto* describe = w.New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
+    for (const auto& [name, size, type] : {std::tuple{u"main", 8u, OCI_PTYPE_SCHEMA}, {u"t", 2u, OCI_PTYPE_TABLE}}) {
+        w.Step("OCIDescribeAny", [&] {
+            return OCIDescribeAny(w.svc, w.err, const_cast<char16_t*>(name), size, OCI_OTYPE_NAME, OCI_DEFAULT,
+                                  static_cast<ub1>(type), describe);
+        });
+    }
+    auto* const root = w.Attribute<dvoid*>(OCI_ATTR_PARAM, describe, OCI_HTYPE_DESCRIBE);
+    auto* const columns = w.Attribute<dvoid*>(OCI_ATTR_LIST_COLUMNS, root, OCI_DTYPE_PARAM);
+    dvoid* column = nullptr;
+    w.Step("OCIParamGet", [&] { return OCIParamGet(columns, OCI_DTYPE_PARAM, w.err, &column, 1); });
+    const auto* const name = w.Attribute<const char16_t*>(OCI_ATTR_NAME, column, OCI_DTYPE_PARAM);
+    w.See(std::u16string_view(name, 1) == u"A" ? "A" : "another");
+}
+
 constexpr Scenario kScenarios[] = {
     {"ArrayInsert", Ground::session, Table, ArrayInsert,
      "5;0earlier,10aa,20a text too long for a short string,30-,40-,50ee;"},
@@ -535,6 +552,7 @@ constexpr Scenario kScenarios[] = {
     {"StatementCache", Ground::session, Table, StatementCache, "1;2;1;3;2;"},
     {"DescribedColumns", Ground::session, Table, DescribedColumns,
      "A;2;a column with a long name;1;D;12;A + 1;2;2;SECOND;"},
+    {"DescribeTable", Ground::session, Table, DescribeTable, "A;", OCI_UTF16},
 };
 
 }  // namespace

@@ -1,0 +1,358 @@
+// Every number that is an attribute of something, over every kind of handle: what can be read, in which width, what can
+// be set and read back, and 24315 for everything else. What applications may know of failover, too.
+#include <map>
+
+#include "support/call_fixture.h"
+
+namespace {
+
+// Letters of kinds: e environment, r error, c service context, s statement, b bind, d define, D describe, v server,
+// u session, t transaction, x subscription, n snapshot; of parameters: i of a select list, k of a table's columns,
+// T table, V view, L list, S schema, B database, m object in a list. `get`: a letter and its width: 1, 2, 4, 8 bytes,
+// t text, h handle, g an identifier of 140 bytes, w a descriptor that this is none of; "*" stands for all the others.
+struct Known { ub4 number; const char* get; const char* set; };
+constexpr Known kKnown[] = {
+    {1, "e4r4i2k2", ""}, {2, "e4i2k2", ""}, {3, "v1c1i4k4", "vc"}, {4, "r4itktTtVtStBtmt", ""}, {5, "i2k1*h", ""},
+    {6, "chi1k1", "c"}, {7, "chi1k1", "c"}, {8, "chitkt", "c"}, {9, "s4itkt", ""}, {10, "s2", ""}, {11, "s4i2k2", "s"},
+    {12, "s4", "s"}, {13, "s4", "s"}, {14, "s4", "s"}, {15, "b4d4", "bd"}, {16, "b2d2", "bd"}, {17, "b2d2", "bd"},
+    {18, "s4D4", ""}, {19, "sw", ""}, {22, "ut", "u"}, {23, "", "u"}, {24, "s2", ""}, {25, "vt", "v"}, {26, "vt", "v"},
+    {27, "tg", "t"}, {28, "t4", ""}, {29, "tt", "t"}, {30, "e4", ""}, {31, "e2b2d2i2k2B2", "bd"},
+    {32, "b1d1i1k1", "bd"}, {33, "b4", "b"}, {34, "e4", "e"}, {35, "e4", "e"}, {36, "e2", "e"}, {37, "e2", "e"},
+    {38, "e2", "e"}, {42, "b4", ""}, {43, "", "v"}, {44, "c1v1", ""}, {73, "s4", ""}, {74, "r4", ""}, {84, "e4", ""},
+    {85, "vt", "v"}, {86, "", "u"}, {94, "xt", "x"}, {95, "xh", "x"}, {96, "xh", "x"}, {98, "x4", "x"}, {99, "", "u"},
+    {100, "", "u"}, {102, "T2V2", ""}, {103, "ThVh", ""}, {104, "T4", ""}, {105, "T1", ""}, {106, "T1", ""},
+    {107, "T1", ""}, {110, "ihkh", ""}, {121, "L2", ""}, {122, "T4V4", ""}, {123, "i1k1T1V1L1S1B1m1", ""},
+    {124, "Dh", ""}, {126, "T4", ""}, {128, "L2", ""}, {129, "s2", ""}, {130, "T1", ""}, {131, "T1", ""},
+    {132, "T2", ""}, {134, "TtVtStBtmt", ""}, {135, "TtVtmt", ""}, {136, "T4V4", ""}, {142, "t4", "t"},
+    {143, "v4", ""}, {144, "st", ""}, {163, "b4d4", "bd"}, {164, "s4", ""}, {176, "c4", "c"}, {182, "s4", ""},
+    {188, "u4", ""}, {190, "s4", ""}, {191, "b4d4", ""}, {193, "v1", ""}, {197, "s4", ""}, {198, "n4", "n"},
+    {199, "n4", "n"}, {209, "e1", ""}, {218, "s1Bt", ""}, {224, "ut", "u"}, {250, "", "D"}, {261, "Sh", ""},
+    {262, "e2B2", ""}, {263, "Bh", ""}, {264, "B4", ""}, {265, "B4", ""}, {266, "B1", ""}, {267, "B1", ""},
+    {268, "B1", ""}, {269, "B1", ""}, {270, "B1", ""}, {271, "B1", ""}, {272, "B1", ""}, {278, "", "u"}, {284, "", "D"},
+    {285, "i1k1", ""}, {286, "i2k2", ""}, {288, "ut", "u"}, {306, "*h", ""}, {366, "", "u"}, {367, "", "u"},
+    {368, "", "u"}, {391, "vt", ""}, {424, "", "u"}, {425, "ut", "u"}, {426, "u4", "u"}, {457, "s8", ""}};
+
+struct Handle { dvoid* pointer; ub4 type; };
+
+class AttributesTest : public CallFixture {
+protected:
+    void SetUp() override {
+        CallFixture::SetUp();
+        ASSERT_EQ(LogOn(&svc_, ":memory:"), 0);
+        stmt_ = New<OCIStmt>(OCI_HTYPE_STMT);
+        for (const char* sql : {"create table t(a number(5,2) not null, b timestamp(3), c nvarchar2(7))",
+                                "create view v as select a from t", "insert into t values(1, null, 'x')"}) {
+            ASSERT_EQ(Run(sql, 1), 0) << sql;
+        }
+    }
+    void TearDown() override {
+        OCILogoff(svc_, err_);
+        CallFixture::TearDown();
+    }
+    sb4 Run(const char* sql, ub4 iterations, ub4 mode = OCI_DEFAULT) {
+        const sword code = OCIStmtPrepare(stmt_, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
+        if (code != OCI_SUCCESS) return Answer(code);
+        return Answer(OCIStmtExecute(svc_, stmt_, err_, iterations, 0, nullptr, nullptr, mode));
+    }
+    sb4 Describe(OCIDescribe* describe, const char* name, ub1 type, ub1 pointer = OCI_OTYPE_NAME, ub1 level = 0) {
+        return Answer(OCIDescribeAny(svc_, err_, Text(name), Length(name), pointer, level, type, describe));
+    }
+    dvoid* Described(const char* name, ub1 type) {
+        auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
+        EXPECT_EQ(Describe(describe, name, type), 0) << name;
+        return Attribute<dvoid*>(describe, OCI_HTYPE_DESCRIBE, OCI_ATTR_PARAM);
+    }
+    dvoid* Below(dvoid* parameter, ub4 list, ub4 position) {
+        dvoid* found = nullptr;
+        EXPECT_EQ(Member(Attribute<dvoid*>(parameter, OCI_DTYPE_PARAM, list), &found, position), 0) << position;
+        return found;
+    }
+    sb4 Member(dvoid* of, dvoid** found, ub4 position, ub4 type = OCI_DTYPE_PARAM) const {
+        return Answer(OCIParamGet(of, type, err_, found, position));
+    }
+    [[nodiscard]] std::string Name(dvoid* of, ub4 attribute, ub4 type = OCI_DTYPE_PARAM) const {
+        const char* text = nullptr;
+        ub4 size = 0;
+        const sb4 answer = Answer(OCIAttrGet(of, type, &text, &size, attribute, err_));
+        return answer == 0 ? std::string(text, size) : "!" + std::to_string(answer);
+    }
+    sb4 Set(dvoid* on, ub4 type, ub4 attribute, dvoid* value, ub4 size = 0) const {
+        return Answer(OCIAttrSet(on, type, value, size, attribute, err_));
+    }
+    std::map<char, Handle> OneOfEach();
+    void Check(char kind, const Handle& handle, const Known& known);
+
+    OCISvcCtx* svc_ = nullptr;
+    OCIStmt* stmt_ = nullptr;
+};
+
+std::map<char, Handle> AttributesTest::OneOfEach() {
+    auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(":memory:"), 8, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER, server), 0);
+    static OCIBind* bind = nullptr;
+    static OCIDefine* define = nullptr;
+    static sb4 number = 0;
+    bind = nullptr, define = nullptr;
+    const char* sql = "select a from t where a = :1";
+    OCIStmtPrepare(stmt_, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
+    EXPECT_EQ(Answer(OCIBindByPos(stmt_, &bind, err_, 1, &number, 4, SQLT_INT, nullptr, nullptr, nullptr, 0, nullptr,
+                                  OCI_DEFAULT)), 0);
+    EXPECT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &number, 4, SQLT_INT, nullptr, nullptr, nullptr,
+                                    OCI_DEFAULT)), 0);
+    EXPECT_EQ(Answer(OCIStmtExecute(svc_, stmt_, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
+    dvoid *item = nullptr, *snapshot = nullptr;
+    EXPECT_EQ(Member(stmt_, &item, 1, OCI_HTYPE_STMT), 0);
+    EXPECT_EQ(OCIDescriptorAlloc(env_, &snapshot, OCI_DTYPE_SNAP, 0, nullptr), OCI_SUCCESS);
+    auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
+    EXPECT_EQ(Describe(describe, "t", OCI_PTYPE_TABLE), 0);
+    dvoid* table = Attribute<dvoid*>(describe, OCI_HTYPE_DESCRIBE, OCI_ATTR_PARAM);
+    dvoid* schema = Described("main", OCI_PTYPE_SCHEMA);
+    const ub4 parameter = OCI_DTYPE_PARAM;
+    return {{'e', {env_, OCI_HTYPE_ENV}}, {'r', {New<OCIError>(OCI_HTYPE_ERROR), OCI_HTYPE_ERROR}},
+            {'c', {svc, OCI_HTYPE_SVCCTX}}, {'s', {stmt_, OCI_HTYPE_STMT}}, {'b', {bind, OCI_HTYPE_BIND}},
+            {'d', {define, OCI_HTYPE_DEFINE}}, {'D', {describe, OCI_HTYPE_DESCRIBE}},
+            {'v', {New<OCIServer>(OCI_HTYPE_SERVER), OCI_HTYPE_SERVER}},
+            {'u', {New<OCISession>(OCI_HTYPE_SESSION), OCI_HTYPE_SESSION}},
+            {'t', {New<OCITrans>(OCI_HTYPE_TRANS), OCI_HTYPE_TRANS}},
+            {'x', {New<dvoid>(OCI_HTYPE_SUBSCRIPTION), OCI_HTYPE_SUBSCRIPTION}}, {'n', {snapshot, OCI_DTYPE_SNAP}},
+            {'i', {item, parameter}}, {'k', {Below(table, OCI_ATTR_LIST_COLUMNS, 1), parameter}},
+            {'T', {table, parameter}}, {'V', {Described("v", OCI_PTYPE_VIEW), parameter}},
+            {'L', {Attribute<dvoid*>(table, parameter, OCI_ATTR_LIST_COLUMNS), parameter}}, {'S', {schema, parameter}},
+            {'B', {Described("memory", OCI_PTYPE_DATABASE), parameter}},
+            {'m', {Below(schema, OCI_ATTR_LIST_OBJECTS, 0), parameter}}};
+}
+
+char WidthOf(const char* get, char kind) {
+    char others = 0;
+    for (; *get != 0; get += 2) {
+        if (get[0] == kind) return get[1];
+        if (get[0] == '*') others = get[1];
+    }
+    return others;
+}
+
+void AttributesTest::Check(char kind, const Handle& handle, const Known& known) {
+    SCOPED_TRACE(std::string("attribute ") + std::to_string(known.number) + " of " + kind);
+    const char width = WidthOf(known.get, kind);
+    const bool is_set = std::strchr(known.set, kind) != nullptr;
+    unsigned char area[256], untouched[256];
+    std::memset(area, 0xEE, sizeof area);
+    std::memset(untouched, 0xEE, sizeof untouched);
+    ub4 size = 7777;
+    const auto get = [&] { return Answer(OCIAttrGet(handle.pointer, handle.type, area, &size, known.number, err_)); };
+    const sb4 answer = get();
+    const bool is_integer = width >= '1' && width <= '8';
+    const size_t bytes = is_integer ? width - '0' : width == 't' || width == 'h' ? 8 : width == 'g' ? 140 : 0;
+    EXPECT_EQ(answer, width == 0 ? 24315 : width == 'w' ? OCI_INVALID_HANDLE : 0);
+    EXPECT_EQ(std::memcmp(area + bytes, untouched, sizeof area - bytes), 0) << "more than its width is written";
+    if (bytes > 0 && width != 't') {
+        EXPECT_EQ(size, bytes);
+        EXPECT_EQ(Answer(OCIAttrGet(handle.pointer, handle.type, nullptr, &size, known.number, err_)), 21560);
+    }
+    ub4 value = known.number == OCI_ATTR_CHARSET_ID ? 873 : 1;
+    static char identifier[140] = "xid";
+    dvoid* pointer = nullptr;
+    if (width == 'h' && known.number < 90) std::memcpy(&pointer, area, sizeof pointer);
+    const ub4 number = known.number;
+    const bool is_text = number == OCI_ATTR_PASSWORD || number == OCI_ATTR_CLIENT_IDENTIFIER || number > 360;
+    if (width == 't' || is_text) pointer = const_cast<char*>("MAIN");
+    if (is_integer || handle.type == OCI_HTYPE_DESCRIBE) pointer = &value;
+    if (width == 'g') pointer = identifier;
+    EXPECT_EQ(Set(handle.pointer, handle.type, number, pointer, width == 'g' ? 140 : pointer ? 4 : 0), is_set ? 0 : 24315);
+    if (!is_set || width == 0) return;
+    ASSERT_EQ(get(), 0);
+    ub4 read = 0;
+    if (is_integer) std::memcpy(&read, area, bytes);
+    EXPECT_EQ(read, is_integer ? value : 0) << "read back";
+    EXPECT_TRUE(width != 't' || Name(handle.pointer, known.number, handle.type) == "MAIN");
+    EXPECT_TRUE(width != 'g' || std::memcmp(area, identifier, 140) == 0);
+}
+
+TEST_F(AttributesTest, EveryNumberOverEveryKind) {
+    const std::map<char, Handle> handles = OneOfEach();
+    std::map<ub4, Known> known;
+    for (const Known& row : kKnown) known[row.number] = row;
+    for (ub4 number = 0; number <= 600; ++number) {
+        const Known row = known.contains(number) ? known[number] : Known{number, "", ""};
+        for (const auto& [kind, handle] : handles) Check(kind, handle, row);
+    }
+}
+
+TEST_F(AttributesTest, ValuesThatAreRefused) {
+    const std::map<char, Handle> handles = OneOfEach();
+    static ub4 integer = 0;
+    static const char* const text = "a group of more than 30 letters";
+    const struct { char kind; ub4 attribute; ub4 integer; const char* text; ub4 size; sb4 answer; } cases[] = {
+        {'b', OCI_ATTR_PDSCL, 127, nullptr, 0, 0},           {'b', OCI_ATTR_PDSCL, 128, nullptr, 0, 24328},
+        {'d', OCI_ATTR_PDSCL, 0xFFAC, nullptr, 0, 0},        {'d', OCI_ATTR_PDSCL, 0xFFAB, nullptr, 0, 24328},
+        {'b', OCI_ATTR_PDPRC, 40, nullptr, 0, 0},            {'b', OCI_ATTR_PDPRC, 41, nullptr, 0, 24328},
+        {'b', OCI_ATTR_CHARSET_FORM, 2, nullptr, 0, 0},      {'b', OCI_ATTR_CHARSET_FORM, 3, nullptr, 0, 24328},
+        {'d', OCI_ATTR_CHARSET_FORM, 0, nullptr, 0, 24328},  {'d', OCI_ATTR_CHARSET_ID, 870, nullptr, 0, 24329},
+        {'t', OCI_ATTR_XID, 0, text, 139, 24750},            {'v', OCI_ATTR_SERVER_GROUP, 0, text, 31, 24328},
+        {'v', OCI_ATTR_SERVER_GROUP, 0, text, 30, 0},        {'u', OCI_ATTR_MIGSESSION, 0, text, 0, 24328},
+        {'u', OCI_ATTR_PROXY_CREDENTIALS, 0, text, 0, 24328}};
+    for (const auto& c : cases) {
+        const Handle& on = handles.at(c.kind);
+        integer = c.integer;
+        dvoid* const value = c.text ? const_cast<char*>(c.text) : static_cast<dvoid*>(&integer);
+        EXPECT_EQ(Set(on.pointer, on.type, c.attribute, value, c.size), c.answer) << c.attribute << " " << c.integer;
+    }
+    auto* attached = Attribute<OCIServer*>(handles.at('c').pointer, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
+    EXPECT_EQ(Set(attached, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_GROUP, const_cast<char*>("g"), 1), 24339);
+}
+
+// Of dates and times numbers 16 and 17 mean something else, in one byte.
+TEST_F(AttributesTest, DigitsOfDatetimes) {
+    OCIDefine* define = nullptr;
+    static OCIDateTime* moment = nullptr;
+    ASSERT_EQ(Run("select b from t", 0), 0);
+    ASSERT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &moment, 8, SQLT_TIMESTAMP, nullptr, nullptr, nullptr,
+                                    OCI_DEFAULT)), 0);
+    ub1 digits[2] = {3, 77};
+    for (const ub4 attribute : {OCI_ATTR_FSPRECISION, OCI_ATTR_LFPRECISION}) {
+        EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, attribute, digits), 0);
+        EXPECT_EQ((Attribute<std::pair<ub1, ub1>>(define, OCI_HTYPE_DEFINE, attribute)), std::pair(ub1{3}, ub1{0}));
+    }
+    digits[0] = 10;
+    EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, OCI_ATTR_FSPRECISION, digits), 24328);
+    dvoid *item = nullptr, *table = Described("t", OCI_PTYPE_TABLE);
+    ASSERT_EQ(Member(stmt_, &item, 1, OCI_HTYPE_STMT), 0);
+    for (dvoid* column : {item, Below(table, OCI_ATTR_LIST_COLUMNS, 2)}) {
+        EXPECT_EQ(Attribute<ub1>(column, OCI_DTYPE_PARAM, OCI_ATTR_FSPRECISION), 3);
+        EXPECT_EQ(Name(column, OCI_ATTR_LFPRECISION), "!24315");
+    }
+}
+
+// Kept to itself: nothing fails over.
+sb4 NeverCalled(dvoid*, dvoid*, dvoid*, ub4, ub4) { return OCI_FO_RETRY; }
+static_assert(sizeof(utext) == 2 && UB4MAXVAL + 1 == UB4MINVAL && SB4MINVAL < SB4MAXVAL && SQLT_AFV == 97);
+static_assert(OCI_TYPECODE_BFLOAT == 100 && OCI_TYPECODE_BDOUBLE == 101 && OCI_FO_REAUTH == 4 && OCI_FO_TXNAL == 8);
+
+TEST_F(AttributesTest, MemoryAndFailover) {
+    OCIFocbkStruct failover{NeverCalled, nullptr};
+    EXPECT_EQ(Set(New<OCIServer>(OCI_HTYPE_SERVER), OCI_HTYPE_SERVER, OCI_ATTR_FOCBK, &failover), 0);
+    const auto heap = [&] { return Attribute<ub4>(env_, OCI_HTYPE_ENV, OCI_ATTR_HEAPALLOC); };
+    const ub4 before = heap();
+    dvoid* handle = nullptr;
+    EXPECT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 10000, nullptr), OCI_SUCCESS);
+    EXPECT_GE(heap(), before + 10000);
+    EXPECT_EQ(OCIHandleFree(handle, OCI_HTYPE_STMT), OCI_SUCCESS);
+    EXPECT_EQ(heap(), before);
+}
+
+TEST_F(AttributesTest, LastCall) {
+    const auto last = [&] { return Attribute<ub4>(err_, OCI_HTYPE_ERROR, OCI_ATTR_FNCODE); };
+    auto* other = New<OCIError>(OCI_HTYPE_ERROR);
+    EXPECT_EQ(Attribute<ub4>(env_, OCI_HTYPE_ENV, OCI_ATTR_FNCODE), 2u) << "a handle was allocated";
+    EXPECT_EQ(Attribute<ub4>(other, OCI_HTYPE_ERROR, OCI_ATTR_FNCODE), 0u) << "no call yet";
+    EXPECT_EQ(last(), 54u);
+    EXPECT_EQ(Run("select a from t", 0), 0);
+    EXPECT_EQ(last(), 21u);
+    OCIStmtFetch(stmt_, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT);
+    EXPECT_EQ(last(), 28u);
+    EXPECT_EQ(last(), 28u) << "asking does not count";
+    OCIBreak(svc_, err_);
+    EXPECT_EQ(last(), 50u);
+    OCIPing(svc_, err_, OCI_DEFAULT);
+    EXPECT_EQ(last(), 0u) << "has no number";
+    OCISvcCtx* svc = nullptr;
+    EXPECT_EQ(LogOn(&svc, ":memory:"), 0);
+    EXPECT_EQ(last(), 76u);
+    OCILogoff(svc, err_);
+    EXPECT_EQ(last(), 77u);
+}
+
+TEST_F(AttributesTest, DescribeRefuses) {
+    auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
+    const struct { const char* name; ub1 type; ub1 pointer; ub1 level; sb4 answer; } cases[] = {
+        {"nowhere", OCI_PTYPE_TABLE, OCI_OTYPE_NAME, 0, 942},   {"t", OCI_PTYPE_VIEW, OCI_OTYPE_NAME, 0, 942},
+        {"nowhere", OCI_PTYPE_UNK, OCI_OTYPE_NAME, 0, 4043},    {"t", OCI_PTYPE_SEQ, OCI_OTYPE_NAME, 0, 4043},
+        {"t", OCI_PTYPE_FUNC, OCI_OTYPE_NAME, 0, 4043},         {"t", OCI_PTYPE_COL, OCI_OTYPE_NAME, 0, 24372},
+        {"t", 255, OCI_OTYPE_NAME, 0, 24372},                   {"t", OCI_PTYPE_TABLE, OCI_OTYPE_REF, 0, 24372},
+        {"t", OCI_PTYPE_TABLE, OCI_OTYPE_PTR, 0, 24372},        {"t", OCI_PTYPE_TABLE, 4, 0, 21560},
+        {"t", OCI_PTYPE_TABLE, OCI_OTYPE_NAME, 1, 24300},       {nullptr, OCI_PTYPE_TABLE, OCI_OTYPE_NAME, 0, 21560}};
+    dvoid* parameter = nullptr;
+    for (const auto& c : cases) {
+        ASSERT_EQ(Describe(describe, "t", OCI_PTYPE_UNK), 0);
+        EXPECT_EQ(Describe(describe, c.name, c.type, c.pointer, c.level), c.answer) << int{c.type} << " " << c.answer;
+        EXPECT_EQ(Member(describe, &parameter, 1, OCI_HTYPE_DESCRIBE), 24334) << "nothing is left of the one before";
+    }
+    EXPECT_EQ(Describe(Bogus<OCIDescribe>(), "t", OCI_PTYPE_TABLE), OCI_INVALID_HANDLE);
+    EXPECT_EQ(Answer(OCIDescribeAny(New<OCISvcCtx>(OCI_HTYPE_SVCCTX), err_, Text("t"), 1, OCI_OTYPE_NAME, 0,
+                                    OCI_PTYPE_TABLE, describe)), 3114);
+    OCIHandleFree(describe, OCI_HTYPE_DESCRIBE);
+    EXPECT_EQ(Describe(describe, "t", OCI_PTYPE_TABLE), OCI_INVALID_HANDLE);
+}
+
+TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
+    auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
+    ASSERT_EQ(Describe(describe, "T", OCI_PTYPE_TABLE), 0);
+    dvoid *root = nullptr, *again = nullptr, *columns = nullptr;
+    ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
+    const std::int64_t blocks = [&] {
+        for (ub4 position = 1; position <= 3; ++position) again = Below(root, OCI_ATTR_LIST_COLUMNS, position);
+        return OCI_memGetMemCount();
+    }();
+    EXPECT_EQ(Below(root, OCI_ATTR_LIST_COLUMNS, 3), again) << "the same one when asked again";
+    EXPECT_EQ(OCI_memGetMemCount(), blocks);
+    EXPECT_EQ(Attribute<ub1>(again, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_FORM), SQLCS_NCHAR);
+    EXPECT_EQ(Attribute<ub2>(again, OCI_DTYPE_PARAM, OCI_ATTR_CHAR_SIZE), 7);
+    EXPECT_EQ(OCIDescriptorFree(root, OCI_DTYPE_PARAM), OCI_SUCCESS);
+    EXPECT_EQ(Name(again, OCI_ATTR_NAME), "C") << "its object's parameter is gone, its handle lives";
+    ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
+    columns = Attribute<dvoid*>(root, OCI_DTYPE_PARAM, OCI_ATTR_LIST_COLUMNS);
+    for (const ub4 position : {0u, 4u, kHuge}) EXPECT_EQ(Member(columns, &again, position), 24334) << position;
+    EXPECT_EQ(Member(columns, nullptr, 1), 21560);
+    EXPECT_EQ(Member(root, &again, 1), 24334) << "no list";
+    EXPECT_EQ(Member(root, &again, 1, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
+    EXPECT_EQ(Member(describe, &again, 1, OCI_HTYPE_SERVER), 24316);
+    ASSERT_EQ(Run("drop table t", 1), 0);
+    EXPECT_EQ(Name(root, OCI_ATTR_OBJ_NAME), "T") << "as it was";
+    EXPECT_EQ(Describe(describe, "main", OCI_PTYPE_SCHEMA), 0);
+    EXPECT_EQ(OCIDescriptorFree(columns, OCI_DTYPE_PARAM), OCI_INVALID_HANDLE) << "gone with what it described";
+}
+
+TEST_F(AttributesTest, CurrentSchema) {
+    auto* session = Attribute<OCISession*>(svc_, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
+    const auto set = [&](OCISession* on, const char* schema) {
+        return Set(on, OCI_HTYPE_SESSION, OCI_ATTR_CURRENT_SCHEMA, const_cast<char*>(schema), Length(schema));
+    };
+    const auto read = [&](OCISession* of) { return Name(of, OCI_ATTR_CURRENT_SCHEMA, OCI_HTYPE_SESSION); };
+    EXPECT_EQ(read(session), "MAIN");
+    EXPECT_EQ(set(session, "other"), 1435);
+    EXPECT_EQ(set(session, "main"), 0);
+    EXPECT_EQ(read(session), "main");
+    auto* own = New<OCISession>(OCI_HTYPE_SESSION);
+    EXPECT_EQ(read(own), "");
+    EXPECT_EQ(set(own, "other"), 0) << "asked for when it begins";
+    auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
+    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(":memory:"), 8, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER, server), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, own, OCI_CRED_EXT, OCI_DEFAULT)), 1435);
+    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, own, OCI_DEFAULT)), 1012) << "it did not begin";
+    EXPECT_EQ(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_USERNAME, const_cast<char*>("ann"), 3), 0);
+    EXPECT_EQ(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_PASSWORD, const_cast<char*>("one"), 3), 0);
+    EXPECT_EQ(set(own, "ANN"), 0);
+    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, own, OCI_CRED_RDBMS, OCI_DEFAULT)), 0) << "the user's own";
+}
+
+// Converted texts stay where they are while others of the handle are asked for.
+TEST(Attributes, Utf16TextsStay) {
+    OCIEnv* env = NewEnvironment(OCI_UTF16);
+    auto* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
+    auto* session = NewHandle<OCISession>(env, OCI_HTYPE_SESSION);
+    const ub4 attributes[] = {OCI_ATTR_USERNAME, OCI_ATTR_EDITION, OCI_ATTR_CONNECTION_CLASS, OCI_ATTR_CURRENT_SCHEMA};
+    const char16_t* names[4] = {};
+    for (int index = 0; index < 4; ++index) {
+        const char16_t name[] = {static_cast<char16_t>(u'a' + index), u'é', 0};
+        OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char16_t*>(name), 4, attributes[index], err);
+        EXPECT_EQ(OCIAttrGet(session, OCI_HTYPE_SESSION, &names[index], nullptr, attributes[index], err), OCI_SUCCESS);
+    }
+    for (int index = 0; index < 4; ++index) EXPECT_EQ(names[index][0], u'a' + index);
+    OCIHandleFree(env, OCI_HTYPE_ENV);
+}
+
+}  // namespace
