@@ -53,8 +53,10 @@ std::span<const AttributeRow> DescribeHandle::Attributes() const { return kRows;
 
 // A memory function that is called meanwhile may describe, too: the last one stays.
 void DescribeHandle::Show(std::shared_ptr<const describe::Node> root) {
-    Description* shown = root ? Create<Description>(*this, 0, 0, std::move(root)) : nullptr;
-    if (Description* before = std::exchange(description_, shown)) Destroy(before);
+    if (Description* before = std::exchange(description_, nullptr)) Destroy(before);
+    if (!root) return;
+    auto* shown = Create<Description>(*this, 0, 0, std::move(root));
+    if (Description* meanwhile = std::exchange(description_, shown)) Destroy(meanwhile);
 }
 
 Status DescribeHandle::GetParameter(std::uint32_t position, void** out) {

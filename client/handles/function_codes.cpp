@@ -28,7 +28,7 @@ constexpr Code kCodes[] = {
     {"OCIConnectionPoolCreate", 100}, {"OCIConnectionPoolDestroy", 101}, {"OCILogon2", 102}, {"OCIRowidToChar", 103},
     {"OCISessionPoolCreate", 104}, {"OCISessionPoolDestroy", 105}, {"OCISessionGet", 106}, {"OCISessionRelease", 107},
     {"OCIStmtPrepare2", 108}, {"OCIStmtRelease", 109}, {"OCIArrayDescriptorAlloc", 127},
-    {"OCIStmtFetch2", 28},
+    {"OCIStmtFetch2", 28}, {"OCIDefineByPos2", 65}, {"OCIBindByPos2", 66}, {"OCIBindByName2", 67},
 };
 
 }  // namespace

@@ -1,12 +1,48 @@
 // Texts of error records, and texts put into the application's buffers.
 #include <gtest/gtest.h>
 
+#include "describe/describe_handle.h"
+#include "handles/attributes.h"
 #include "handles/environment.h"
 #include "handles/error_handle.h"
 #include "oci.h"
 #include "platform/utf.h"
 
 namespace {
+
+// What engines tell of sequences and synonyms, as attributes: numbers in the form that applications know.
+TEST(Parameters, SequencesAndSynonyms) {
+    Environment* const environment = Environment::Open(OCI_DEFAULT, {}, 0);
+    auto* const handle = Create<DescribeHandle>(*environment, OCI_HTYPE_DESCRIBE, 0);
+    const auto get = [&](std::uint32_t attribute) -> std::string {
+        void* parameter = nullptr;
+        const char* text = nullptr;
+        std::uint32_t size = 0;
+        EXPECT_TRUE(handle->GetParameter(1, &parameter).Ok());
+        const Status status = GetAttribute(*Live<Parameter>(parameter), &text, &size, attribute);
+        return status.Ok() ? std::string(text, size) : std::to_string(status.Number());
+    };
+    engine::ObjectDescription object;
+    object.kind = engine::ObjectKind::sequence;
+    object.sequence_least = -7, object.sequence_most = 1234, object.sequence_step = 2, object.sequence_mark = 0;
+    handle->Show(describe::DescribedObject(object, ""));
+    const auto number = [](std::string_view bytes) { return std::string(bytes) + std::string(22 - bytes.size(), '\0'); };
+    EXPECT_EQ(get(OCI_ATTR_MIN), number("\x03\x3e\x5e\x66"));
+    EXPECT_EQ(get(OCI_ATTR_MAX), number("\x03\xc2\x0d\x23"));
+    EXPECT_EQ(get(OCI_ATTR_INCR), number("\x02\xc1\x03"));
+    EXPECT_EQ(get(OCI_ATTR_HW_MARK), number("\x01\x80"));
+    EXPECT_EQ(get(OCI_ATTR_CACHE), "24315") << "not told";
+    EXPECT_EQ(get(OCI_ATTR_LIST_COLUMNS), "24315");
+    object = {};
+    object.kind = engine::ObjectKind::synonym;
+    object.name = "S", object.target = "T", object.target_schema = "MAIN";
+    handle->Show(describe::DescribedObject(object, ""));
+    EXPECT_EQ(get(OCI_ATTR_NAME), "T");
+    EXPECT_EQ(get(OCI_ATTR_SCHEMA_NAME), "MAIN");
+    EXPECT_EQ(get(OCI_ATTR_OBJ_NAME), "S");
+    EXPECT_EQ(get(OCI_ATTR_LINK), "");
+    Destroy(environment);
+}
 
 TEST(ErrorTexts, NumberStateAndWords) {
     const struct { int number; const char* state; const char* text;
