@@ -9,6 +9,7 @@
 #include "oci_functions.h"
 #include "oci_failover.h"
 #include "oci_values.h"
+#include "oci_intervals.h"
 #include "oci_services.h"
 #include "oci_legacy.h"
 

@@ -133,6 +133,18 @@ typedef struct OCIDate {
     OCITime OCIDateTime;
 } OCIDate;
 
+/* The parts of an OCIDate; each is a statement of its own. */
+#define OCIDateGetTime(date, hour, min, sec) \
+    { *(hour) = (date)->OCIDateTime.OCITimeHH; *(min) = (date)->OCIDateTime.OCITimeMI; \
+      *(sec) = (date)->OCIDateTime.OCITimeSS; }
+#define OCIDateGetDate(date, year, month, day) \
+    { *(year) = (date)->OCIDateYYYY; *(month) = (date)->OCIDateMM; *(day) = (date)->OCIDateDD; }
+#define OCIDateSetTime(date, hour, min, sec) \
+    { (date)->OCIDateTime.OCITimeHH = (hour); (date)->OCIDateTime.OCITimeMI = (min); \
+      (date)->OCIDateTime.OCITimeSS = (sec); }
+#define OCIDateSetDate(date, year, month, day) \
+    { (date)->OCIDateYYYY = (year); (date)->OCIDateMM = (month); (date)->OCIDateDD = (day); }
+
 /* Callbacks answer OCI_CONTINUE to go on. The one for input stores a length; those for output the address of one. */
 typedef sb4 (*OCICallbackInBind)(dvoid *ctx, OCIBind *bindp, ub4 iter, ub4 index,
                                  dvoid **bufpp, ub4 *alenp, ub1 *piecep, dvoid **indpp);

@@ -75,7 +75,7 @@ sword OCIDateToText(OCIError *err, CONST OCIDate *date, CONST OraText *fmt, ub1 
                     ub4 langLen, ub4 *bufsize, OraText *buf);
 
 /* Datetimes; `hndl` is an environment or a session. Besides the published functions, the names of the driver that end
-   in NS take the same arguments, and the two setters change one half of a descriptor. Fractions are microseconds. */
+   in NS take the same arguments, and the two setters change one half of a descriptor. Fractions are nanoseconds. */
 sword OCIDateTimeAssign(dvoid *hndl, OCIError *err, CONST OCIDateTime *from, OCIDateTime *to);
 sword OCIDateTimeCheck(dvoid *hndl, OCIError *err, CONST OCIDateTime *date, ub4 *flags);
 sword OCIDateTimeCompare(dvoid *hndl, OCIError *err, CONST OCIDateTime *date1, CONST OCIDateTime *date2, sword *out);

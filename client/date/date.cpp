@@ -158,6 +158,17 @@ Errno AddMonths(const DateTime& value, std::int64_t months, DateTime* result) no
     return 0;
 }
 
+Errno MoveMonths(const DateTime& value, std::int64_t months, DateTime* result) noexcept {
+    if (const Errno number = Validate(value)) return number;
+    int year = 0, month = 0;
+    if (!MoveMonths(value, months, &year, &month)) return errors::kBadYear;
+    DateTime moved = value;
+    SetDay(year, month, value.day, &moved);
+    if (const Errno number = ValidateDate(moved)) return number;
+    *result = moved;
+    return 0;
+}
+
 Errno LastDay(const DateTime& value, DateTime* result) noexcept {
     if (const Errno number = Validate(value)) return number;
     *result = value;

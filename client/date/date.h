@@ -61,6 +61,7 @@ int DayOfYear(const DateTime& value) noexcept;                     // from 1
 // Arithmetic; the time of day stays. Operands must be valid.
 Errno AddDays(const DateTime& value, std::int64_t days, DateTime* result) noexcept;
 Errno AddMonths(const DateTime& value, std::int64_t months, DateTime* result) noexcept;    // last day stays last day
+Errno MoveMonths(const DateTime& value, std::int64_t months, DateTime* result) noexcept;   // same day, or 1839
 Errno LastDay(const DateTime& value, DateTime* result) noexcept;
 Errno NextDay(const DateTime& value, int day_of_week, DateTime* result) noexcept;          // 0 is Sunday
 // Rounds the fraction half up to `digits` places, 0 to 9. A full second is carried into the time, the date and the

@@ -1,6 +1,8 @@
 // Datetime descriptors: which parts a type has, and what storing does with the others.
 #include "date/descriptor.h"
 
+#include "date/format.h"
+#include "date/interval_descriptor.h"
 #include "date/zone.h"
 #include "handles/errors.h"
 #include "oci_constants.h"
@@ -132,4 +134,35 @@ Status DateTimeDescriptor::Compare(const DateTimeDescriptor& left, const DateTim
     if (left.HasDate() != right.HasDate()) return Error(errors::kNotComparable);
     const int number = date::CompareMoments(left.value_, right.value_, result);
     return number ? Error(number) : Status();
+}
+
+Status DateTimeDescriptor::ZoneOffset(int* minutes) const {
+    if (!is_set_) return Error(errors::kInvalidDateTime);
+    if (!value_.has_zone && ZoneRule() != Zone::local) return Error(errors::kNoSuchField);
+    date::DateTime value = value_;
+    if (const int number = value.has_zone ? 0 : date::SetZone({}, &value)) return Error(number);
+    *minutes = value.zone_minutes;
+    return {};
+}
+
+std::string_view DateTimeDescriptor::UsualModel() const {
+    switch (Type()) {
+        case OCI_DTYPE_DATE: return date::kDateModel;
+        case OCI_DTYPE_TIME: return date::kTimeModel;
+        case OCI_DTYPE_TIME_TZ: return date::kTimeZoneModel;
+        default: return value_.has_zone ? date::kTimestampZoneModel : date::kTimestampModel;
+    }
+}
+
+Status DateTimeDescriptor::Move(const DateTimeDescriptor& from, const date::Interval& interval) {
+    if (!from.is_set_) return Error(errors::kInvalidDateTime);
+    date::DateTime moved;
+    if (const int number = date::AddInterval(from.value_, interval, &moved)) return Error(number);
+    return Store(moved);
+}
+
+IntervalPlace* FindInterval(const void* pointer) noexcept {
+    if (auto* interval = Live<IntervalDescriptor>(pointer)) return &interval->place;
+    auto* general = Live<DateTimeDescriptor>(pointer);
+    return general && general->Type() == kGeneralType ? &static_cast<GeneralDescriptor*>(general)->place : nullptr;
 }

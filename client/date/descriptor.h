@@ -4,6 +4,7 @@
 #include <string_view>
 
 #include "date/date.h"
+#include "date/interval.h"
 #include "handles/object.h"
 #include "handles/status.h"
 
@@ -31,6 +32,13 @@ public:
     Status SetTime(const date::DateTime& time);    // the rest, but for the zone
     Status GetDate(date::DateTime* value) const;   // error 1878 when the type has no date, 1866 when unset
     Status GetTime(date::DateTime* value) const;
+
+    // Minutes east of Greenwich. Error 1878 for a value without a zone.
+    Status ZoneOffset(int* minutes) const;
+    // The format model that text calls use when they are given none.
+    [[nodiscard]] std::string_view UsualModel() const;
+    // Takes another's value moved by an interval.
+    Status Move(const DateTimeDescriptor& from, const date::Interval& interval);
 
     // What is wrong with the value, in the bits of OCIDateTimeCheck: nothing but being unset can be.
     [[nodiscard]] date::Flags Check() const;

@@ -14,6 +14,8 @@ namespace date {
 constexpr std::string_view kDateModel = "DD-MON-RR";                             // character data to and from DATE
 constexpr std::string_view kTimestampModel = "DD-MON-RR HH.MI.SSXFF AM";
 constexpr std::string_view kTimestampZoneModel = "DD-MON-RR HH.MI.SSXFF AM TZR";
+constexpr std::string_view kTimeModel = "HH.MI.SSXFF AM";
+constexpr std::string_view kTimeZoneModel = "HH.MI.SSXFF AM TZR";
 constexpr std::string_view kShortDateModel = "DD-MON-YY";                        // OCIDateToText, OCIDateFromText
 
 // Names in a language. English is first in the list and the one for "no language".
@@ -25,9 +27,10 @@ const Language* FindLanguage(std::string_view name) noexcept;    // null when un
 enum class Scope : unsigned char { date, timestamp };
 
 // Writes the value's text. *length is set on success, and on kBufferTooSmall to the size that is needed. No
-// terminator is written. The value must be valid.
+// terminator is written. The value must be valid. fraction_digits: how many an FF without a number of digits writes; -1:
+// microseconds, unless the value has more.
 Errno ToText(const DateTime& value, std::string_view model, const Language& language, Scope scope, char* text,
-             std::size_t capacity, std::size_t* length) noexcept;
+             std::size_t capacity, std::size_t* length, int fraction_digits = -1) noexcept;
 
 // Reads a text that fits the model. Fields that the model does not name: the current year and month, day 1, time 0.
 Errno FromText(std::string_view text, std::string_view model, const Language& language, Scope scope,

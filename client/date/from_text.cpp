@@ -24,7 +24,9 @@ constexpr Word kEras[] = {{"a.d.", 1}, {"b.c.", -1}, {"ad", 1}, {"bc", -1}};
 
 bool IsPunctuation(char c) { return c > ' ' && c < '\x7f' && !IsLetter(c) && !IsDigit(c); }
 bool IsSign(char c) { return c == '+' || c == '-'; }
-bool TakesSign(const Element& element) { return element.has_sign || element.field == Field::zone_hour; }
+bool TakesSign(const Element& element) {
+    return element.has_sign || element.field == Field::zone_hour || element.field == Field::zone_region;
+}
 bool TakesNumber(const Element& element) {
     return element.numeric || element.field == Field::fraction || element.field == Field::zone_hour ||
            element.field == Field::zone_minute || element.field == Field::comma_year;

@@ -118,8 +118,8 @@ std::string_view OrdinalEnding(int number) {
 
 class Formatter {
 public:
-    Formatter(const DateTime& value, const Language& language, Scope scope, Writer& writer)
-        : value_(value), language_(language), scope_(scope), writer_(writer) {}
+    Formatter(const DateTime& value, const Language& language, Scope scope, int fraction_digits, Writer& writer)
+        : value_(value), language_(language), scope_(scope), fraction_digits_(fraction_digits), writer_(writer) {}
 
     Errno Run(std::string_view text) {
         Model model(text);
@@ -223,10 +223,11 @@ private:
 
     // Without a number of digits: microseconds, unless the value has more.
     void PutFraction(unsigned digits) {
-        if (digits == 0) digits = value_.nanosecond % 1000 == 0 ? 6 : 9;
+        if (digits == 0 && fraction_digits_ >= 0) digits = static_cast<unsigned>(fraction_digits_);
+        else if (digits == 0) digits = value_.nanosecond % 1000 == 0 ? 6 : 9;
         unsigned fraction = value_.nanosecond;
         for (unsigned i = digits; i < 9; ++i) fraction /= 10;
-        writer_.PutDigits(fraction, digits);
+        if (digits > 0) writer_.PutDigits(fraction, digits);
     }
 
     // A value without a zone is in that of the process.
@@ -258,6 +259,7 @@ private:
     const DateTime& value_;
     const Language& language_;
     Scope scope_;
+    int fraction_digits_;
     Writer& writer_;
     bool filled_ = true;    // leading zeros and trailing blanks
     Errno error_ = 0;       // a zone that could not be told
@@ -266,9 +268,9 @@ private:
 }  // namespace
 
 Errno ToText(const DateTime& value, std::string_view model, const Language& language, Scope scope, char* text,
-             std::size_t capacity, std::size_t* length) noexcept {
+             std::size_t capacity, std::size_t* length, int fraction_digits) noexcept {
     Writer writer(text, capacity);
-    if (const Errno number = Formatter(value, language, scope, writer).Run(model)) return number;
+    if (const Errno number = Formatter(value, language, scope, fraction_digits, writer).Run(model)) return number;
     *length = writer.Length();
     return writer.Length() > capacity ? errors::kBufferTooSmall : 0;
 }

@@ -300,6 +300,28 @@ Errno ToLocal(const DateTime& value, DateTime* result) noexcept {
         [&] { return ToOffset(value, OffsetMinutes(ProcessZone().At(MomentSeconds(value))), result); });
 }
 
+Errno MoveMoment(const DateTime& value, std::int64_t seconds, DateTime* result) noexcept {
+    if (value.month == 0) return errors::kNoSuchField;
+    DateTime moved = value;
+    if (const Errno number = MoveSeconds(seconds, &moved)) return number;
+    if (const Region* region = TheRegions().Get(value.region)) {
+        const int minutes = OffsetMinutes(region->rules.At(MomentSeconds(value) + seconds));
+        if (const Errno number = MoveSeconds((minutes - value.zone_minutes) * 60, &moved)) return number;
+        moved.zone_minutes = static_cast<std::int16_t>(minutes);
+    }
+    *result = moved;
+    return 0;
+}
+
+Errno SecondsBetween(const DateTime& left, const DateTime& right, std::int64_t* seconds) noexcept {
+    if (left.month == 0 || right.month == 0) return errors::kNoSuchField;
+    return Guarded([&]() -> Errno {
+        const bool plain = !left.has_zone && !right.has_zone;
+        *seconds = plain ? WallSeconds(left) - WallSeconds(right) : MomentSeconds(left) - MomentSeconds(right);
+        return 0;
+    });
+}
+
 Errno Now(DateTime* result) noexcept {
     timespec now{};
     clock_gettime(CLOCK_REALTIME, &now);

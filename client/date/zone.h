@@ -32,6 +32,12 @@ Errno CompareMoments(const DateTime& left, const DateTime& right, int* order) no
 Errno ToOffset(const DateTime& value, int zone_minutes, DateTime* result) noexcept;
 Errno ToLocal(const DateTime& value, DateTime* result) noexcept;
 
+// The value that many seconds later: with a region, in the offset that is in force there then. 1841 outside of the
+// calendar. The fraction stays.
+Errno MoveMoment(const DateTime& value, std::int64_t seconds, DateTime* result) noexcept;
+// Seconds from `right` to `left`, fractions aside; of times without dates 1878.
+Errno SecondsBetween(const DateTime& left, const DateTime& right, std::int64_t* seconds) noexcept;
+
 // The clock in the zone of the process, without a zone.
 Errno Now(DateTime* result) noexcept;
 

@@ -4,35 +4,11 @@
 #include "date/date.h"
 #include "date/format.h"
 #include "date/zone.h"
-#include "entry/call_text.h"
+#include "entry/model_arguments.h"
 #include "handles/errors.h"
 #include "handles/gate.h"
 
 namespace {
-
-// What both text functions take beside the text: the model and the language.
-class ModelArguments {
-public:
-    ModelArguments(const Environment& environment, const OraText* model, std::size_t model_length,
-                   const OraText* language, std::size_t language_length)
-        : model_(environment, model, model_length, false), language_(environment, language, language_length, false) {}
-
-    date::Errno Resolve() {
-        if (!model_.Valid() || !language_.Valid()) return errors::kBadText;
-        if (!language_.View().empty()) known_ = date::FindLanguage(language_.View());
-        return known_ ? 0 : errors::kBadLanguage;
-    }
-
-    [[nodiscard]] std::string_view Model() const {
-        return model_.View().empty() ? date::kShortDateModel : model_.View();
-    }
-    [[nodiscard]] const date::Language& Language() const { return *known_; }
-
-private:
-    CallText model_;
-    CallText language_;
-    const date::Language* known_ = &date::kEnglish;
-};
 
 // A date made from a date: change(value, result).
 template <class Change>
@@ -57,32 +33,6 @@ sword MeasureDates(OCIError* err, const OCIDate* left, const OCIDate* right, Num
         *out = measure(first, second);
         return {};
     });
-}
-
-// Writes into the application's area; the length is set to the text's, or to what would be needed.
-Status WriteText(const Environment& environment, const date::DateTime& value, const ModelArguments& arguments,
-                 ub4* size, OraText* out) {
-    std::string text(256, '\0');
-    std::size_t length = 0;
-    auto write = [&] {
-        return date::ToText(value, arguments.Model(), arguments.Language(), date::Scope::date, text.data(), text.size(),
-                            &length);
-    };
-    int number = write();
-    if (number == errors::kBufferTooSmall) {
-        text.resize(length);
-        number = write();
-    }
-    if (number) return Error(number);
-    std::string converted;
-    const std::string_view shown = TextOut(environment, std::string_view(text).substr(0, length), converted);
-    const ub4 room = *size;
-    *size = static_cast<ub4>(shown.size());
-    if (shown.size() > room) {
-        return Error(errors::kBufferTooSmall, std::to_string(shown.size()) + " bytes are needed");
-    }
-    shown.copy(reinterpret_cast<char*>(out), shown.size());
-    return {};
 }
 
 }  // namespace
@@ -152,7 +102,7 @@ sword OCIDateFromText(OCIError* err, const OraText* str, ub4 strLen, const OraTe
         if (!str || !out) return Error(errors::kNullArgument);
         const CallText text(error.Env(), str, strLen, false);
         if (!text.Valid()) return Error(errors::kBadText);
-        ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
+        ModelArguments arguments(error.Env(), date::kShortDateModel, fmt, fmtLen, lang, langLen);
         if (const int number = arguments.Resolve()) return Error(number);
         date::DateTime value;
         if (const int number =
@@ -170,8 +120,10 @@ sword OCIDateToText(OCIError* err, const OCIDate* given, const OraText* fmt, ub1
         if (!given || !bufsize || !buf) return Error(errors::kNullArgument);
         const date::DateTime value = date::FromOciDate(*given);
         if (const int number = date::Validate(value)) return Error(number);
-        ModelArguments arguments(error.Env(), fmt, fmtLen, lang, langLen);
+        ModelArguments arguments(error.Env(), date::kShortDateModel, fmt, fmtLen, lang, langLen);
         if (const int number = arguments.Resolve()) return Error(number);
-        return WriteText(error.Env(), value, arguments, bufsize, buf);
+        std::string text;
+        Status written = DateText(value, arguments, date::Scope::date, text);
+        return written.Ok() ? WriteText(error.Env(), text, bufsize, buf) : written;
     });
 }

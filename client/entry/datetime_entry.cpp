@@ -1,41 +1,8 @@
 // The datetime package: calls on datetime descriptors. Each published function and its twin whose name ends in NS do
 // the same. Fractions are nanoseconds, or microseconds when kelpcli.ini says so.
-#include "date/descriptor.h"
 #include "date/fraction.h"
 #include "entry/call_text.h"
-#include "handles/errors.h"
-#include "handles/gate.h"
-
-namespace {
-
-// A descriptor that is no living one is refused like any bad handle; null is a missing argument.
-Status FindDescriptor(const OCIDateTime* pointer, DateTimeDescriptor*& descriptor) {
-    if (!pointer) return Error(errors::kNullArgument);
-    descriptor = Live<DateTimeDescriptor>(pointer);
-    return descriptor ? Status() : InvalidHandle();
-}
-
-// Calls on one descriptor: body(environment, descriptor).
-template <class Body>
-sword EnterDateTime(void* handle, OCIError* err, const OCIDateTime* pointer, Body body) {
-    return EnterHandle(handle, err, [&](Environment& environment) -> Status {
-        DateTimeDescriptor* descriptor = nullptr;
-        Status found = FindDescriptor(pointer, descriptor);
-        return found.Ok() ? body(environment, *descriptor) : found;
-    });
-}
-
-// Calls on two: body(first, second).
-template <class Body>
-sword EnterDateTimes(void* handle, OCIError* err, const OCIDateTime* first, const OCIDateTime* second, Body body) {
-    return EnterDateTime(handle, err, first, [&](Environment&, DateTimeDescriptor& one) -> Status {
-        DateTimeDescriptor* other = nullptr;
-        Status found = FindDescriptor(second, other);
-        return found.Ok() ? body(one, *other) : found;
-    });
-}
-
-}  // namespace
+#include "entry/datetime_values.h"
 
 sword OCIDateTimeAssign(dvoid* hndl, OCIError* err, const OCIDateTime* from, OCIDateTime* to) {
     return EnterDateTimes(hndl, err, from, to, [](const auto& source, auto& target) { return target.Assign(source); });

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <span>
 
-#include "date/descriptor.h"
+#include "date/interval_descriptor.h"
 #include "describe/describe_handle.h"
 #include "describe/parameter.h"
 #include "handles/errors.h"
@@ -77,8 +77,8 @@ constexpr Maker kDescriptors[] = {
     {OCI_DTYPE_AQMSG_PROPERTIES, Make<PlainDescriptor>},
     {OCI_DTYPE_AQAGENT, Make<PlainDescriptor>},
     {OCI_DTYPE_LOCATOR, Make<PlainDescriptor>},
-    {OCI_DTYPE_INTERVAL_YM, Make<DateTimeDescriptor>},    // the general datetime has this number, too
-    {OCI_DTYPE_INTERVAL_DS, Make<PlainDescriptor>},
+    {OCI_DTYPE_INTERVAL_YM, Make<GeneralDescriptor>},    // the general datetime has this number, too
+    {OCI_DTYPE_INTERVAL_DS, Make<IntervalDescriptor>},
     {OCI_DTYPE_AQNFY_DESCRIPTOR, Make<PlainDescriptor>},
     {OCI_DTYPE_DATE, Make<DateTimeDescriptor>},
     {OCI_DTYPE_TIME, Make<DateTimeDescriptor>},
