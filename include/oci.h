@@ -10,6 +10,7 @@
 #include "oci_failover.h"
 #include "oci_values.h"
 #include "oci_intervals.h"
+#include "oci_nls.h"
 #include "oci_services.h"
 #include "oci_legacy.h"
 

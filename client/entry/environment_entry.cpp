@@ -11,10 +11,11 @@ namespace {
 
 constexpr sword kClientVersion[] = {1, 0, 0, 0, 0};
 
-sword OpenEnvironment(OCIEnv** env_out, ub4 mode, const MemoryFunctions& memory, size_t extra, dvoid** extra_out) {
+sword OpenEnvironment(OCIEnv** env_out, ub4 mode, const Environment::CharacterSets& sets, const MemoryFunctions& memory,
+                      size_t extra, dvoid** extra_out) {
     if (!env_out) return OCI_ERROR;
     const CallInFlight call;
-    Environment* environment = Environment::Open(mode, memory, extra);
+    Environment* environment = Environment::Open(mode, sets, memory, extra);
     if (!environment) return OCI_ERROR;
     *env_out = AsHandle<OCIEnv>(environment);
     if (extra_out) *extra_out = environment->UserMemory();
@@ -30,13 +31,27 @@ MemoryFunctions Functions(const dvoid* context, OCIAllocFunction allocate, OCIFr
 // The reallocation function is never needed: what grows is allocated anew.
 sword OCIEnvCreate(OCIEnv** envOut, ub4 mode, const dvoid* memctx, OCIAllocFunction allocate, OCIReallocFunction,
                    OCIFreeFunction release, size_t extra, dvoid** extraOut) {
-    return OpenEnvironment(envOut, mode, Functions(memctx, allocate, release), extra, extraOut);
+    return OpenEnvironment(envOut, mode, Environment::SetsOf(mode), Functions(memctx, allocate, release), extra,
+                           extraOut);
+}
+
+// A set of 0 is what the mode says or else the locale's; the national one's 0 is the other's.
+sword OCIEnvNlsCreate(OCIEnv** envOut, ub4 mode, const dvoid* memctx, OCIAllocFunction allocate, OCIReallocFunction,
+                      OCIFreeFunction release, size_t extra, dvoid** extraOut, ub2 charset, ub2 ncharset) try {
+    const ub2 usual = mode & OCI_UTF16 ? OCI_UTF16ID : charset::IdOfLocale();
+    const CharacterSet* text = charset::Find(charset ? charset : usual);
+    const CharacterSet* national = ncharset ? charset::Find(ncharset) : text;
+    if (!text || !national) return OCI_ERROR;
+    return OpenEnvironment(envOut, mode, {text, national}, Functions(memctx, allocate, release), extra, extraOut);
+} catch (const std::bad_alloc&) {
+    return OCI_ERROR;
 }
 
 sword OCIEnvInit(OCIEnv** envOut, ub4 mode, size_t extra, dvoid** extraOut) {
     const ProcessDefaults defaults = GetProcessDefaults();
     const ub4 own_mode = mode & ~static_cast<ub4>(OCI_ENV_NO_UCB | OCI_ENV_NO_MUTEX);
-    return OpenEnvironment(envOut, defaults.mode | own_mode, defaults.memory, extra, extraOut);
+    const ub4 whole_mode = defaults.mode | own_mode;
+    return OpenEnvironment(envOut, whole_mode, Environment::SetsOf(whole_mode), defaults.memory, extra, extraOut);
 }
 
 sword OCIInitialize(ub4 mode, const dvoid* memctx, OCIAllocFunction allocate, OCIReallocFunction,

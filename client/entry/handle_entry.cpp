@@ -22,7 +22,8 @@ Object* Make(Object& parent, TypeCode type, size_t extra) { return Create<T>(par
 
 // An environment of its own, alike the one it is asked from.
 Object* MakeEnvironment(Object& parent, TypeCode, size_t extra) {
-    Environment* environment = Environment::Open(parent.Env().Mode(), parent.Env().Memory(), extra);
+    const Environment& env = parent.Env();
+    Environment* environment = Environment::Open(env.Mode(), env.Sets(), env.Memory(), extra);
     if (!environment) throw std::bad_alloc();
     return environment;
 }

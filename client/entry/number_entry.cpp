@@ -131,9 +131,9 @@ Status WriteText(const OCINumber& value, const FormatArguments& arguments, ub4* 
     return {};
 }
 
-// The same in UTF-16, by way of a text of our own.
-Status WriteUtf16(const Environment& environment, const OCINumber& value, const FormatArguments& arguments, ub4* size,
-                  OraText* out) {
+// The same in a set other than UTF-8, by way of a text of our own.
+Status WriteConverted(const Environment& environment, const OCINumber& value, const FormatArguments& arguments, ub4* size,
+                      OraText* out) {
     std::string text(256, '\0');
     std::size_t length = 0;
     auto write = [&] {
@@ -370,7 +370,7 @@ sword OCINumberToText(OCIError* err, const OCINumber* value, const OraText* fmt,
         const Environment& environment = error.Env();
         FormatArguments arguments(environment, fmt, fmtLen, nls, nlsLen);
         if (const Errno problem = arguments.Resolve()) return Error(problem);
-        return environment.Utf16() ? WriteUtf16(environment, *value, arguments, bufsize, buf)
-                                   : WriteText(*value, arguments, bufsize, buf);
+        return environment.Converts() ? WriteConverted(environment, *value, arguments, bufsize, buf)
+                                      : WriteText(*value, arguments, bufsize, buf);
     });
 }

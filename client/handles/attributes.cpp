@@ -63,7 +63,7 @@ void StoreText(Object& object, std::uint32_t attribute, const AttributeValue& va
                std::uint32_t* size) {
     const std::string_view text = value.text;
     std::string_view out = text;
-    if (object.Env().Utf16() && !value.converted) out = TextOut(object.Env(), text, object.KeptText(attribute));
+    if (object.Env().Converts() && !value.converted) out = TextOut(object.Env(), text, object.KeptText(attribute));
     const char* pointer = out.empty() ? nullptr : out.data();
     std::memcpy(target, &pointer, sizeof pointer);
     if (size) *size = static_cast<std::uint32_t>(out.size());

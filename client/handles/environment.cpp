@@ -46,15 +46,18 @@ void ReleaseTo(const MemoryFunctions& memory, void* aligned) noexcept {
 std::mutex defaults_mutex;
 ProcessDefaults process_defaults;
 
-constexpr std::uint16_t kCharacterSetUtf8 = 873;
-
 Status InObjectMode(Environment& environment, AttributeValue& value) {
     value.integer = environment.Mode() & OCI_OBJECT ? 1 : 0;
     return {};
 }
 
-Status CharacterSet(Environment& environment, AttributeValue& value) {
-    value.integer = environment.Utf16() ? OCI_UTF16ID : kCharacterSetUtf8;
+Status TextSet(Environment& environment, AttributeValue& value) {
+    value.integer = charset::Id(*environment.Sets().text);
+    return {};
+}
+
+Status NationalSet(Environment& environment, AttributeValue& value) {
+    value.integer = charset::Id(*environment.Sets().national);
     return {};
 }
 
@@ -75,8 +78,8 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_OBJECT, Shape::ub4, Get<E, InObjectMode>, nullptr},
     {OCI_ATTR_HEAPALLOC, Shape::ub4, Get<E, HeapBytes>, nullptr},
     {OCI_ATTR_SHARED_HEAPALLOC, Shape::ub4, Get<E, NoSharedHeap>, nullptr},
-    {OCI_ATTR_CHARSET_ID, Shape::ub2, Get<E, CharacterSet>, nullptr},
-    {OCI_ATTR_NCHARSET_ID, Shape::ub2, Get<E, CharacterSet>, nullptr},
+    {OCI_ATTR_CHARSET_ID, Shape::ub2, Get<E, TextSet>, nullptr},
+    {OCI_ATTR_NCHARSET_ID, Shape::ub2, Get<E, NationalSet>, nullptr},
     {OCI_ATTR_ENV_UTF16, Shape::ub1, Get<E, InUtf16>, nullptr},
     {OCI_ATTR_CACHE_OPT_SIZE, Shape::ub4, GetField<&E::cache_optimal_size>, SetField<&E::cache_optimal_size>},
     {OCI_ATTR_CACHE_MAX_SIZE, Shape::ub4, GetField<&E::cache_maximal_excess>, SetField<&E::cache_maximal_excess>},
@@ -101,16 +104,24 @@ ProcessDefaults GetProcessDefaults() {
     return process_defaults;
 }
 
-Environment::Environment(const Origin& origin, std::uint32_t mode, const MemoryFunctions& memory)
-    : Object(origin), mode_(mode), utf16_(mode & OCI_UTF16), threaded_(mode & OCI_THREADED), memory_(memory) {}
+Environment::Environment(const Origin& origin, std::uint32_t mode, const CharacterSets& sets,
+                         const MemoryFunctions& memory)
+    : Object(origin), mode_(mode), sets_(sets), converts_(!charset::IsUtf8(*sets.text)),
+      utf16_(charset::IsUtf16(*sets.text)), threaded_(mode & OCI_THREADED), memory_(memory) {}
 
-Environment* Environment::Open(std::uint32_t mode, const MemoryFunctions& given, std::size_t extra) noexcept {
+Environment::CharacterSets Environment::SetsOf(std::uint32_t mode) {
+    const CharacterSet* set = charset::Find(mode & OCI_UTF16 ? OCI_UTF16ID : charset::kUtf8);
+    return {set, set};
+}
+
+Environment* Environment::Open(std::uint32_t mode, const CharacterSets& sets, const MemoryFunctions& given,
+                               std::size_t extra) noexcept {
     const MemoryFunctions memory = given.allocate && given.release ? given : MemoryFunctions{};
     void* block = AllocateFrom(memory, sizeof(Environment));
     if (!block) return nullptr;
     held_blocks.fetch_add(1, std::memory_order_relaxed);
     auto* environment = static_cast<Environment*>(block);
-    new (block) Environment(Origin{*environment, nullptr, OCI_HTYPE_ENV}, mode, memory);
+    new (block) Environment(Origin{*environment, nullptr, OCI_HTYPE_ENV}, mode, sets, memory);
     try {
         ObjectTree::Adopt(*environment, kKind, extra);
         return environment;

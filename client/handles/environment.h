@@ -9,6 +9,7 @@
 #include <string>
 #include <string_view>
 
+#include "handles/character_set.h"
 #include "handles/error_handle.h"
 #include "handles/object.h"
 #include "handles/status.h"
@@ -26,11 +27,22 @@ public:
 
     [[nodiscard]] const MemoryFunctions& Memory() const { return memory_; }
 
+    // The application's character sets: of texts, and of national ones.
+    struct CharacterSets {
+        const CharacterSet* text;
+        const CharacterSet* national;
+    };
+    // UTF-8, or by the mode UTF-16, for both.
+    static CharacterSets SetsOf(std::uint32_t mode);
+
     // Null when memory fails. The environment lies in memory of the functions given.
-    static Environment* Open(std::uint32_t mode, const MemoryFunctions& memory, std::size_t extra) noexcept;
+    static Environment* Open(std::uint32_t mode, const CharacterSets& sets, const MemoryFunctions& memory,
+                             std::size_t extra) noexcept;
 
     [[nodiscard]] std::uint32_t Mode() const { return mode_; }
-    [[nodiscard]] bool Utf16() const { return utf16_; }
+    [[nodiscard]] const CharacterSets& Sets() const { return sets_; }
+    [[nodiscard]] bool Converts() const { return converts_; }    // texts are not UTF-8
+    [[nodiscard]] bool Utf16() const { return utf16_; }          // their units have two bytes
     [[nodiscard]] bool Threaded() const { return threaded_; }
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
 
@@ -52,11 +64,13 @@ public:
 private:
     friend class ObjectTree;
     friend class RetiredObjects;
-    Environment(const Origin& origin, std::uint32_t mode, const MemoryFunctions& memory);
+    Environment(const Origin& origin, std::uint32_t mode, const CharacterSets& sets, const MemoryFunctions& memory);
 
     void Close() noexcept;    // the end of its own memory
 
     std::uint32_t mode_;
+    CharacterSets sets_;
+    bool converts_;
     bool utf16_;
     bool threaded_;
     std::atomic<std::uint64_t> heap_bytes_{0};    // of what Allocate gave and Release did not get back
@@ -81,8 +95,8 @@ struct ProcessDefaults {
 void SetProcessDefaults(const ProcessDefaults& defaults);
 ProcessDefaults GetProcessDefaults();
 
-// A text of the application's as UTF-8. Bytes are borrowed, not copied; UTF-16 is converted. `length` counts bytes.
-// Malformed UTF-16 (an odd length, half a pair) makes Valid false: error 24501.
+// A text of the application's as UTF-8. UTF-8 is borrowed, not copied; other sets are converted. `length` counts bytes.
+// What is no text in the set (in UTF-16 an odd length, half a pair) makes Valid false: error 24501.
 class TextIn {
 public:
     TextIn(const Environment& environment, const void* text, std::size_t length);
@@ -95,7 +109,8 @@ private:
     bool valid_ = true;
 };
 
-// UTF-8 to a form that the application reads: itself, or UTF-16 in `converted`. The view is bytes.
+// UTF-8 to a form that the application reads: itself, or the environment's set in `converted`, where '?'
+// stands for what the set lacks. The view is bytes.
 std::string_view TextOut(const Environment& environment, std::string_view utf8, std::string& converted);
 
 // Puts a text into the application's buffer, cut to whole characters and closed with a zero (two in UTF-16). False when

@@ -2,22 +2,22 @@
 #include <cstring>
 
 #include "handles/environment.h"
-#include "platform/utf.h"
 
 TextIn::TextIn(const Environment& environment, const void* text, std::size_t length) {
     if (!text || length == 0) return;
-    if (!environment.Utf16()) {
-        view_ = {static_cast<const char*>(text), length};
+    const std::string_view given(static_cast<const char*>(text), length);
+    if (!environment.Converts()) {
+        view_ = given;
         return;
     }
-    valid_ = utf::ToUtf8(text, length, converted_);
+    valid_ = charset::ToUtf8(*environment.Sets().text, given, converted_);
     view_ = converted_;
 }
 
 std::string_view TextOut(const Environment& environment, std::string_view utf8, std::string& converted) {
-    if (!environment.Utf16()) return utf8;
+    if (!environment.Converts()) return utf8;
     converted.clear();
-    utf::ToUtf16Replacing(utf8, converted);
+    charset::FromUtf8(*environment.Sets().text, utf8, converted);
     return converted;
 }
 
@@ -27,7 +27,7 @@ bool TextToBuffer(const Environment& environment, std::string_view utf8, void* b
     std::string converted;
     const std::string_view text = TextOut(environment, utf8, converted);
     const std::size_t room = size - zero;
-    const std::size_t length = environment.Utf16() ? utf::WholeUtf16(text, room) : utf::WholeUtf8(text, room);
+    const std::size_t length = charset::Whole(*environment.Sets().text, text, room);
     std::memcpy(buffer, text.data(), length);
     std::memset(static_cast<char*>(buffer) + length, 0, zero);
     return length == text.size();

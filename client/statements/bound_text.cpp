@@ -56,7 +56,7 @@ void BoundText::Release(const Object& statement) noexcept {
 const std::string& BoundText::KeptName(std::size_t placeholder, bool indicator, const Environment& environment) {
     const sql::Placeholder& source = scanned_.placeholders[placeholder];
     const std::string& name = indicator ? source.indicator : source.name;
-    if (!environment.Utf16()) return name;
+    if (!environment.Converts()) return name;
     if (kept_names_.size() < bound_.size() * 2) kept_names_.resize(bound_.size() * 2);
     std::string& kept = kept_names_[placeholder * 2 + indicator];
     TextOut(environment, name, kept);

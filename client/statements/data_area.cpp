@@ -39,7 +39,13 @@ constexpr AttributeRow Kept(std::uint32_t attribute, Shape shape) {
 
 template <class Handle>
 Status SetCharacterSet(Object& object, const AttributeValue& value) {
-    return AreaOf<Handle>(object).UseCharacterSet(static_cast<std::uint16_t>(value.integer));
+    DataArea& area = AreaOf<Handle>(object);
+    return area.UseCharacterSet(static_cast<std::uint16_t>(value.integer), area.character_form);
+}
+template <class Handle>
+Status SetCharacterForm(Object& object, const AttributeValue& value) {
+    DataArea& area = AreaOf<Handle>(object);
+    return area.UseCharacterSet(area.character_set, static_cast<std::uint8_t>(value.integer));
 }
 template <class Handle>
 Status GetScale(Object& object, AttributeValue& value) {
@@ -121,7 +127,7 @@ constexpr AttributeRow kBindRows[] = {
 
 DataArea::DataArea(Object& handle, TypeCode handle_type) : handle_type_(handle_type) {
     workspace.environment = &handle.Env();
-    workspace.utf16 = handle.Env().Utf16();
+    workspace.Use(*handle.Env().Sets().text);
     workspace.holder = &handle;
 }
 
@@ -163,11 +169,14 @@ void DataArea::SetSteps(ub4 value, ub4 indicator, ub4 length, ub4 code) {
     elements.code_step = code;
 }
 
-// Character data is UTF-8 or UTF-16; other sets would come out as something else than they say.
-Status DataArea::UseCharacterSet(std::uint16_t id) {
-    if (!values::KnowsCharacterSet(id)) return Error(errors::kBadCharacterSet);
+// A set that the library does not know would come out as something else than it says.
+Status DataArea::UseCharacterSet(std::uint16_t id, std::uint8_t form) {
+    const Environment::CharacterSets& sets = workspace.environment->Sets();
+    const CharacterSet* set = id != 0 ? charset::Find(id) : form == SQLCS_NCHAR ? sets.national : sets.text;
+    if (!set) return Error(errors::kBadCharacterSet);
     character_set = id;
-    workspace.utf16 = id == 0 ? workspace.environment->Utf16() : id == OCI_UTF16ID;
+    character_form = form;
+    workspace.Use(*set);
     return {};
 }
 

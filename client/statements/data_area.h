@@ -89,7 +89,8 @@ public:
     }
     [[nodiscard]] bool InPieces() const { return in_pieces_; }
     [[nodiscard]] const Callbacks& AsksBy() const { return callbacks_; }
-    Status UseCharacterSet(std::uint16_t id);
+    // 0 is the environment's: the national one for the form SQLCS_NCHAR. Error 24329 for a set that is not known.
+    Status UseCharacterSet(std::uint16_t id, std::uint8_t form);
 
     values::Elements elements;
     values::Workspace workspace;

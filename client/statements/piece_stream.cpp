@@ -24,7 +24,7 @@ void TellCode(const DataArea& area, ub4 row, const PieceBuffer& piece, int numbe
 // How many bytes of `rest` a buffer takes without tearing a character apart.
 std::size_t PieceLength(const DataArea& area, std::string_view rest, std::size_t room) {
     if (area.Type()->family != values::Family::text) return std::min(rest.size(), room);
-    return area.workspace.utf16 ? utf::WholeUtf16(rest, room) : utf::WholeUtf8(rest, room);
+    return values::WholeCharacters(area.workspace, rest, room);
 }
 
 // Moves the next part of `rest` into the buffer; terminated types get a zero that is not counted.

@@ -2,7 +2,6 @@
 #include "handles/attributes.h"
 #include "handles/environment.h"
 #include "handles/errors.h"
-#include "platform/utf.h"
 #include "statements/statement.h"
 #include "values/rowid_descriptor.h"
 
@@ -57,10 +56,10 @@ struct StatementAttributes {
     // Bytes of the application's text before the error.
     static Status ErrorOffset(Statement& statement, AttributeValue& value) {
         value.integer = statement.parse_error_offset_;
-        if (!statement.Env().Utf16()) return {};
+        if (!statement.Env().Converts()) return {};
         std::string units;
-        utf::ToUtf16(std::string_view(statement.Text()).substr(0, statement.parse_error_offset_), units);
-        value.integer = units.size();
+        const auto before = std::string_view(statement.Text()).substr(0, statement.parse_error_offset_);
+        value.integer = TextOut(statement.Env(), before, units).size();
         return {};
     }
     static Status RowId(Statement& statement, AttributeValue& value) {

@@ -13,6 +13,8 @@
 #include <string_view>
 
 #include "engine/datum.h"
+#include "handles/character_set.h"
+#include "platform/utf.h"
 #include "values/elements.h"
 
 class Environment;
@@ -27,14 +29,25 @@ ColumnClass ClassOf(std::uint16_t internal_type);
 struct Workspace {
     Environment* environment = nullptr;
     std::atomic<const void*> holder{nullptr};    // the bind or define handle; null once it is gone
-    bool utf16 = false;                 // character data of the application is UTF-16; else UTF-8
+    const CharacterSet* set = nullptr;  // of the application's character data; null: UTF-8
+    bool utf16 = false;                 // its units have two bytes
     ColumnClass column = ColumnClass::plain;
     std::uint8_t precision = 0;         // of packed decimals; 0: as many digits as the area holds
     std::int8_t scale = 0;
     alignas(8) std::array<char, 128> small{};    // numbers, dates, row ids
     std::string text;                   // converted texts and bytes
-    std::string units;                  // text as UTF-16
+    std::string units;                  // text in the application's set
+
+    void Use(const CharacterSet& of_application) {
+        set = charset::IsUtf8(of_application) ? nullptr : &of_application;
+        utf16 = charset::IsUtf16(of_application);
+    }
 };
+
+// As much of a text in the application's set as `room` bytes hold of whole characters.
+inline std::size_t WholeCharacters(const Workspace& workspace, std::string_view text, std::size_t room) {
+    return workspace.set ? charset::Whole(*workspace.set, text, room) : utf::WholeUtf8(text, room);
+}
 
 // An element to be filled. Conversions set `stored` and, when something was cut off, `whole`.
 struct Target {
@@ -94,9 +107,6 @@ int FindType(std::uint16_t code, std::int64_t size, bool may_be_null, const Exte
 engine::Kind KindOf(const ExternalType& type, std::uint32_t size);
 void Widen(engine::Datum& datum, Workspace& workspace);
 
-// Whether the library converts character data of a character set: 0 is the environment's.
-bool KnowsCharacterSet(std::uint16_t id);
-
 // The row of a table that serves a column.
 template <class Function>
 ByKind<Function> ForColumn(const ByOrigin<Function>& row, ColumnClass column) {
@@ -131,7 +141,7 @@ double SingleByDigits(double value);
 // An error of the number package as that of a conversion.
 int AsConversionError(int error);
 
-// UTF-8 in the application's form: itself, or UTF-16 in the workspace.
+// UTF-8 in the application's form: itself, or its set in the workspace.
 // What stands for the number of an error when the application has freed the bind or define in mid-call, from a memory
 // function: its memory is not touched any more.
 constexpr int kPlaceGone = -1;

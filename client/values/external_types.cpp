@@ -153,11 +153,6 @@ engine::Kind KindOf(const ExternalType& type, std::uint32_t size) {
     return engine::Kind::null;
 }
 
-bool KnowsCharacterSet(std::uint16_t id) {
-    constexpr std::uint16_t kUtf8 = 871, kUtf8Full = 873;
-    return id == 0 || id == kUtf8 || id == kUtf8Full || id == OCI_UTF16ID;
-}
-
 int Store(const Elements& elements, std::size_t index, const ByKind<OutConverter>& converters, Workspace& workspace,
           const engine::Datum& datum) {
     if (datum.kind == engine::Kind::null) return StoreNull(elements, index);

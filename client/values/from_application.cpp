@@ -28,9 +28,9 @@ void SetView(Kind kind, View view, Datum& datum) {
 }
 
 int SetText(View text, Workspace& workspace, Datum& datum) {
-    if (workspace.utf16) {
+    if (workspace.set) {
         workspace.text.clear();
-        if (!utf::ToUtf8(text.data(), text.size(), workspace.text)) return errors::kBadCharacters;
+        if (!charset::ToUtf8(*workspace.set, text, workspace.text)) return errors::kBadCharacters;
         text = workspace.text;
     }
     SetView(Kind::text, text, datum);

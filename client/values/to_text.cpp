@@ -245,7 +245,7 @@ int BytesOfHex(const Datum& datum, Workspace& workspace, View& bytes) {
 
 // Copies as much as `room` takes; answers the bytes copied.
 std::size_t CopyCut(View text, const Workspace& workspace, char* at, std::size_t room, Target& target) {
-    const std::size_t stored = workspace.utf16 ? utf::WholeUtf16(text, room) : utf::WholeUtf8(text, room);
+    const std::size_t stored = WholeCharacters(workspace, text, room);
     if (stored > 0) std::memcpy(at, text.data(), stored);
     target.stored = static_cast<std::uint32_t>(stored);
     target.whole = text.size();
@@ -280,8 +280,8 @@ int PutAfc(View utf8, Workspace& workspace, Target& target) {
     if (!workspace.utf16) {
         std::memset(target.at + stored, ' ', target.size - stored);
     } else {
-        constexpr char16_t kBlank = u' ';
-        for (std::size_t at = stored; at + 2 <= target.size; at += 2) std::memcpy(target.at + at, &kBlank, 2);
+        const View blank = charset::Blank(*workspace.set);
+        for (std::size_t at = stored; at + 2 <= target.size; at += 2) std::memcpy(target.at + at, blank.data(), 2);
     }
     target.stored = target.size;
     return Outcome(target, stored);
@@ -307,7 +307,7 @@ int PutPrefixed(View utf8, Workspace& workspace, Target& target) {
     View text;
     if (const int error = ToApplication(utf8, workspace, text)) return error;
     const std::size_t room = PrefixedRoom<Prefix>(target);
-    return LayPrefixed<Prefix>(text, workspace.utf16 ? utf::WholeUtf16(text, room) : utf::WholeUtf8(text, room), target);
+    return LayPrefixed<Prefix>(text, WholeCharacters(workspace, text, room), target);
 }
 
 // ---- How bytes are
@@ -341,9 +341,9 @@ constexpr ByOrigin<OutConverter> kBytesRow = {
 
 int ToApplication(View utf8, Workspace& workspace, View& text) {
     text = utf8;
-    if (!workspace.utf16) return 0;
+    if (!workspace.set) return 0;
     workspace.units.clear();
-    if (!utf::ToUtf16(utf8, workspace.units)) return errors::kBadCharacters;
+    if (!charset::FromUtf8(*workspace.set, utf8, workspace.units)) return errors::kBadCharacters;
     text = workspace.units;
     return 0;
 }

@@ -1,0 +1,133 @@
+// Character sets of environments, binds and defines, and the calls on sets and settings. The bytes of the texts are
+// another program's.
+#include "support/call_fixture.h"
+
+namespace {
+
+struct NlsCalls : CallFixture {
+    void Nls(ub2 set, ub2 national = 0) {
+        Close();
+        EXPECT_EQ(OCIEnvNlsCreate(&env_, OCI_DEFAULT, nullptr, nullptr, nullptr, nullptr, 0, nullptr, set, national),
+                  OCI_SUCCESS) << set;
+        err_ = New<OCIError>(OCI_HTYPE_ERROR);
+    }
+};
+
+TEST_F(NlsCalls, TextsAreConverted) {
+    const struct { ub2 set; std::string_view text, utf8; } cases[] = {
+        {178, "Z\xfcr\x80", "Zür€"}, {171, "\xc4\xe0", "Да"}, {46, "\xa4\xe9", "€é"}, {170, "\xa3\x9f", "Łź"},
+        {31, "\xe9", "é"}, {1, "az~", "az~"}, {2000, {"\0\xe9\xd8=\xde\0", 6}, "é😀"}, {871, "é", "é"}};
+    for (const auto& c : cases) {
+        char area[20] = "";
+        size_t length = 0;
+        EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 873, area, sizeof area, c.set, c.text.data(), c.text.size(),
+                                              &length)), 0);
+        EXPECT_EQ(std::string_view(area, length), c.utf8) << c.set;
+        EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, c.set, area, sizeof area, 873, c.utf8.data(), c.utf8.size(),
+                                              &length)), 0);
+        EXPECT_EQ(std::string_view(area, length), c.text) << c.set;
+    }
+    const struct { ub2 to, from; std::string_view text; size_t room; sb4 answer; std::string_view result; } edges[] = {
+        {31, 873, "€😀é", 9, 0, "??\xe9"}, {1, 873, "é", 9, 0, "?"}, {873, 1, "\x80", 9, 24501, ""},
+        {873, 178, "\x81", 9, 24501, ""}, {31, 873, "\xc3", 9, 24501, ""}, {873, 31, "a\xe9", 2, 22059, "a"},
+        {2000, 873, "😀", 3, 22059, ""}, {7, 873, "a", 9, 24329, ""}, {873, 873, "ab", 0, 22059, ""}};
+    for (const auto& c : edges) {
+        char area[10] = "";
+        size_t length = 0;
+        EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, c.to, area, c.room, c.from, c.text.data(), c.text.size(),
+                                              &length)), c.answer) << c.text;
+        EXPECT_EQ(std::string_view(area, length), c.result) << c.text;
+    }
+    ub2 units[4] = {};
+    char bytes[8] = "";
+    size_t length = 0;
+    Nls(178);
+    EXPECT_EQ(OCICharSetToUnicode(env_, units, 4, Text("a\x80"), 2, &length), OCI_SUCCESS);
+    EXPECT_EQ(units[1] * 10 + length, 0x20ACu * 10 + 2);
+    EXPECT_EQ(OCIUnicodeToCharSet(env_, Text(bytes), 8, units, 2, &length), OCI_SUCCESS);
+    EXPECT_EQ(std::string_view(bytes, length), "a\x80");
+    EXPECT_EQ(OCICharSetToUnicode(env_, units, 1, Text("ab"), 2, &length), OCI_ERROR);
+    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV) + static_cast<sb4>(length), 22060);
+}
+
+TEST_F(NlsCalls, NamesAndSettings) {
+    Nls(178, 1000);
+    const struct { ub2 id; const char* name; } sets[] = {
+        {1, "US7ASCII"}, {31, "WE8ISO8859P1"}, {46, "WE8ISO8859P15"}, {170, "EE8MSWIN1250"}, {171, "CL8MSWIN1251"},
+        {178, "WE8MSWIN1252"}, {871, "UTF8"}, {873, "AL32UTF8"}, {2000, "AL16UTF16"}};
+    char text[OCI_NLS_MAXBUFSZ];
+    for (const auto& c : sets) {
+        EXPECT_EQ(OCINlsCharSetNameToId(env_, Text(c.name)), c.id);
+        EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), sizeof text, c.id), OCI_SUCCESS);
+        EXPECT_STREQ(text, c.name);
+    }
+    EXPECT_EQ(OCINlsCharSetNameToId(env_, Text("none")) + OCINlsCharSetNameToId(nullptr, Text("UTF8")), 0);
+    EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), 4, 871), OCI_ERROR);
+    EXPECT_EQ(OCINlsCharSetIdToName(nullptr, Text(text), 9, 871), OCI_INVALID_HANDLE);
+    const struct { ub2 item; const char* text; } items[] = {
+        {1, "Sunday"}, {7, "Saturday"}, {8, "Sun"}, {14, "Sat"}, {15, "January"}, {26, "December"}, {27, "Jan"},
+        {38, "Dec"}, {OCI_NLS_DECIMAL, "."}, {OCI_NLS_CHARACTER_SET, "WE8MSWIN1252"}};
+    for (const auto& c : items) {
+        EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, c.item)), 0);
+        EXPECT_STREQ(text, c.text);
+    }
+    EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, 39)), 12702);
+    const struct { ub2 item; sb4 value; } numbers[] = {{91, 1}, {92, 1}, {93, 178}, {94, 1000}};
+    for (const auto& c : numbers) {
+        sb4 value = -1;
+        EXPECT_EQ(Answer(OCINlsNumericInfoGet(env_, err_, &value, c.item)), 0);
+        EXPECT_EQ(value, c.value) << c.item;
+    }
+    ub2 id = 0;
+    EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 0, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
+    EXPECT_GT(id, 0);
+    EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 1, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_ERROR);
+    OCIEnv* none = nullptr;
+    EXPECT_EQ(OCIEnvNlsCreate(&none, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr, 7, 0), OCI_ERROR);
+    EXPECT_EQ(none, nullptr);
+}
+
+TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
+    Nls(178, 171);
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
+    auto* statement = New<OCIStmt>(OCI_HTYPE_STMT);
+    const struct { ub1 form; ub2 set; std::string_view in, out; } cases[] = {
+        {SQLCS_IMPLICIT, 0, "\x80", "\xe9\x80"}, {SQLCS_NCHAR, 0, "\xc4", "??"}, {SQLCS_IMPLICIT, 873, "€", "\xe9\x80"}};
+    for (const auto& c : cases) {    // the last is read back in the environment's own set
+        const char* sql = "select '\xe9' || :v as \"\xe4\" from dual";
+        EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT)), 0);
+        OCIBind* bind = nullptr;
+        OCIDefine* define = nullptr;
+        char value[4] = "", area[8] = "";
+        ub2 length = 0;
+        c.in.copy(value, sizeof value);
+        EXPECT_EQ(Answer(OCIBindByPos(statement, &bind, err_, 1, value, static_cast<sb4>(c.in.size()), SQLT_CHR, nullptr,
+                                      nullptr, nullptr, 0, nullptr, OCI_DEFAULT)), 0);
+        ub1 form = c.form;
+        ub2 set = c.set;
+        EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &form, 0, OCI_ATTR_CHARSET_FORM, err_)), 0);
+        EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &set, 0, OCI_ATTR_CHARSET_ID, err_)), 0);
+        EXPECT_EQ(Answer(OCIDefineByPos(statement, &define, err_, 1, area, 4, SQLT_AFC, nullptr, &length, nullptr,
+                                        OCI_DEFAULT)), 0);
+        EXPECT_EQ(Answer(OCIStmtExecute(svc, statement, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
+        std::string expected(c.out);
+        if (c.form == SQLCS_NCHAR) expected = "\xe9?";    // a letter that the environment's set lacks
+        expected.resize(4, ' ');
+        EXPECT_EQ(std::string_view(area, 4), expected);
+        set = 7;
+        EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &set, 0, OCI_ATTR_CHARSET_ID, err_)), 24329);
+    }
+    dvoid* column = nullptr;
+    OraText* name = nullptr;
+    ub4 size = 0;
+    EXPECT_EQ(Answer(OCIParamGet(statement, OCI_HTYPE_STMT, err_, &column, 1)), 0);
+    EXPECT_EQ(Answer(OCIAttrGet(column, OCI_DTYPE_PARAM, &name, &size, OCI_ATTR_NAME, err_)), 0);
+    EXPECT_EQ(std::string_view(reinterpret_cast<char*>(name), size), "\xe4");
+    EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 178);
+    EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_NCHARSET_ID), 171);
+    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select '\x81' from dual"), 20, OCI_NTV_SYNTAX, 0)), 24501);
+    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+}
+
+}  // namespace
