@@ -150,6 +150,8 @@
 #define SQLCS_LIT_NULL 5
 #define OCI_UTF16ID 1000
 #define OCI_UCS2ID 1000
+#define OCI_TYPECODE_BFLOAT 21
+#define OCI_TYPECODE_BDOUBLE 22
 #define OCI_TYPECODE_VARRAY 247
 #define OCI_TYPECODE_TABLE 248
 #define OCI_TYPECODE_OBJECT 108
@@ -487,5 +489,17 @@
 #define OCI_EV_TSF 1
 #define OCI_LM_DEF 0
 #define OCI_LM_NBL 1
+
+/* Failover: events, and kinds. */
+#define OCI_FO_END 0x1
+#define OCI_FO_ABORT 0x2
+#define OCI_FO_REAUTH 0x4
+#define OCI_FO_BEGIN 0x8
+#define OCI_FO_ERROR 0x10
+#define OCI_FO_RETRY 25410
+#define OCI_FO_NONE 0x1
+#define OCI_FO_SESSION 0x2
+#define OCI_FO_SELECT 0x4
+#define OCI_FO_TXNAL 0x8
 
 #endif

@@ -57,6 +57,20 @@ typedef text oratext;
 typedef void dvoid;
 #define CONST const
 
+/* The least and the greatest value of each type. */
+#define UB1MINVAL 0
+#define UB1MAXVAL 255
+#define UB2MINVAL 0
+#define UB2MAXVAL 65535
+#define UB4MINVAL 0U
+#define UB4MAXVAL 4294967295U
+#define SB1MINVAL (-127)
+#define SB1MAXVAL 127
+#define SB2MINVAL (-32767)
+#define SB2MAXVAL 32767
+#define SB4MINVAL (-2147483647)
+#define SB4MAXVAL 2147483647
+
 #ifndef TRUE
 #define TRUE 1
 #endif
@@ -154,6 +168,13 @@ typedef sb4 (*OCICallbackDefine)(dvoid *ctx, OCIDefine *defnp, ub4 iter,
                                  dvoid **bufpp, ub4 **alenpp, ub1 *piecep, dvoid **indpp, ub2 **rcodepp);
 typedef sb4 (*OCICallbackLobRead)(dvoid *ctx, CONST dvoid *buf, ub4 len, ub1 piece);
 typedef sb4 (*OCICallbackLobWrite)(dvoid *ctx, dvoid *buf, ub4 *lenp, ub1 *piecep);
+
+/* A failover callback may be registered with a server; there is no failover, so it is never called. */
+typedef sb4 (*OCICallbackFailover)(dvoid *svc, dvoid *env, dvoid *ctx, ub4 type, ub4 event);
+typedef struct OCIFocbkStruct {
+    OCICallbackFailover callback_function;
+    dvoid *fo_ctx;
+} OCIFocbkStruct;
 
 /* Memory functions of an environment, and the routines of the thread package. */
 typedef dvoid *(*OCIAllocFunction)(dvoid *memctx, size_t size);

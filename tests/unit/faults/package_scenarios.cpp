@@ -145,6 +145,37 @@ void Datetimes(World& w) {
     w.See(hour);
 }
 
+// Sets have their tables for the life of the process: each run takes one that none has asked for yet, while any is left.
+void CharacterSets(World& w) {
+    static std::size_t next = 0;
+    constexpr ub2 kSets[] = {31, 32, 46, 170, 171, 178};
+    const ub2 set = kSets[next++ % std::size(kSets)];
+    char text[8] = "";
+    size_t length = 0;
+    for (const auto& [to, from] : {std::pair<ub2, ub2>{set, 873}, {873, set}}) {
+        w.Step("OCINlsCharSetConvert", [&] {
+            return OCINlsCharSetConvert(w.env, w.err, to, text, sizeof text, from, "ab", 2, &length);
+        });
+        w.See({text, length});
+    }
+}
+
+void Intervals(World& w) {
+    auto* moment = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
+    auto* days = w.NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
+    w.Step("OCIIntervalFromText", [&] { return OCIIntervalFromText(w.env, w.err, World::Text("-1 2:3:4.5"), 10, days); });
+    w.Step("OCIDateTimeConstruct", [&] {
+        return OCIDateTimeConstruct(w.env, w.err, moment, 2024, 7, 15, 13, 14, 15, 5, nullptr, 0);
+    });
+    w.Step("OCIDateTimeIntervalAdd", [&] { return OCIDateTimeIntervalAdd(w.env, w.err, moment, days, moment); });
+    OraText text[60] = "";
+    ub4 size = sizeof text;
+    w.Step("OCIDateTimeToText", [&] {
+        return OCIDateTimeToText(w.env, w.err, moment, nullptr, 0, 9, nullptr, 0, &size, text);
+    });
+    w.See({reinterpret_cast<char*>(text), size});
+}
+
 // The zone of the process, which is read once.
 void ZoneOfTheProcess(World& w) {
     auto* zoned = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
@@ -350,6 +381,8 @@ constexpr Scenario kScenarios[] = {
      "SIXTY-SIX, 11:12:13 AM;"},
     {"Datetimes", Ground::environment, FindRegions, Datetimes, "-1;13;"},
     {"ZoneOfTheProcess", Ground::environment, InStJohns, ZoneOfTheProcess, "1;13;", OCI_DEFAULT, true},
+    {"CharacterSets", Ground::environment, nullptr, CharacterSets, "ab;ab;"},
+    {"Intervals", Ground::environment, nullptr, Intervals, "14-JUL-24 11.10.10.500000005 AM;"},
     {"Strings", Ground::environment, nullptr, Strings, "a text that is too long for the room of the first;"},
     {"Raws", Ground::environment, nullptr, Raws, "100;"},
     {"Files", Ground::environment, nullptr, Files, "20000;10;20001;"},
