@@ -7,7 +7,6 @@
 #include "oci_constants.h"
 #include "oci_attributes.h"
 #include "oci_functions.h"
-#include "oci_failover.h"
 #include "oci_values.h"
 #include "oci_intervals.h"
 #include "oci_nls.h"

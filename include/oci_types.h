@@ -57,20 +57,6 @@ typedef text oratext;
 typedef void dvoid;
 #define CONST const
 
-/* The least and the greatest value of each type. */
-#define UB1MINVAL 0
-#define UB1MAXVAL 255
-#define UB2MINVAL 0
-#define UB2MAXVAL 65535
-#define UB4MINVAL 0U
-#define UB4MAXVAL 4294967295U
-#define SB1MINVAL (-127)
-#define SB1MAXVAL 127
-#define SB2MINVAL (-32767)
-#define SB2MAXVAL 32767
-#define SB4MINVAL (-2147483647)
-#define SB4MAXVAL 2147483647
-
 #ifndef TRUE
 #define TRUE 1
 #endif

@@ -44,6 +44,7 @@ Status SetCharacterSet(Object& object, const AttributeValue& value) {
 }
 template <class Handle>
 Status SetCharacterForm(Object& object, const AttributeValue& value) {
+    if (value.integer != SQLCS_IMPLICIT && value.integer != SQLCS_NCHAR) return Error(errors::kBadValue);
     DataArea& area = AreaOf<Handle>(object);
     return area.UseCharacterSet(area.character_set, static_cast<std::uint8_t>(value.integer));
 }
@@ -71,11 +72,6 @@ Status SetPrecision(Object& object, const AttributeValue& value) {
     return {};
 }
 
-template <class Handle>
-Status SetCharacterForm(Object& object, const AttributeValue& value) {
-    if (value.integer != SQLCS_IMPLICIT && value.integer != SQLCS_NCHAR) return Error(errors::kBadValue);
-    return SetArea<Handle, &DataArea::character_form>(object, value);
-}
 template <class Handle, auto member>
 Status SetDigits(Object& object, const AttributeValue& value) {
     return value.integer <= kMostDateDigits ? SetArea<Handle, member>(object, value) : Error(errors::kBadValue);

@@ -90,8 +90,9 @@ TEST(RowStore, ReadsOnAfterAFailure) {
     }
     for (const auto& entry : std::filesystem::directory_iterator("/proc/self/fd")) {
         std::error_code none;
-        if (std::filesystem::read_symlink(entry, none).string().ends_with("(deleted)"))
+        if (std::filesystem::read_symlink(entry, none).string().ends_with("(deleted)")) {
             ASSERT_EQ(truncate(entry.path().c_str(), 4000000 * 3 / 2), 0);
+        }
     }
     Datum value[1];
     std::size_t row = 0;
