@@ -12,7 +12,7 @@ namespace {
 
 // What engines tell of sequences and synonyms, as attributes: numbers in the form that applications know.
 TEST(Parameters, SequencesAndSynonyms) {
-    Environment* const environment = Environment::Open(OCI_DEFAULT, {}, {}, 0);
+    Environment* const environment = Environment::Open(OCI_DEFAULT, Environment::SetsOf(OCI_DEFAULT), {}, 0);
     auto* const handle = Create<DescribeHandle>(*environment, OCI_HTYPE_DESCRIBE, 0);
     const auto get = [&](std::uint32_t attribute) -> std::string {
         void* parameter = nullptr;
@@ -84,7 +84,8 @@ TEST(ErrorLists, KeepWhatIsAdded) {
 
 TEST(TextToBuffer, CutsBetweenCharacters) {
     for (const bool utf16 : {false, true}) {
-        Environment* environment = Environment::Open(utf16 ? OCI_UTF16 : OCI_DEFAULT, {}, {}, 0);
+        const std::uint32_t mode = utf16 ? OCI_UTF16 : OCI_DEFAULT;
+        Environment* environment = Environment::Open(mode, Environment::SetsOf(mode), {}, 0);
         const std::string text = "\xC3\xA4\xF0\x9F\x98\x80z";    // 2, 4 and 1 bytes; 1, 2 and 1 units
         std::string whole;
         const std::string_view out = TextOut(*environment, text, whole);
