@@ -57,7 +57,8 @@ ServiceContext* ResourceManager::GetService() const { return Live<ServiceContext
 // Branches leave the session and come back with connections of their own: a database with one connection is refused.
 Answer ResourceManager::LogOn() {
     const ProcessDefaults defaults = GetProcessDefaults();
-    Environment* const environment = Environment::Open(defaults.mode | OCI_THREADED, defaults.memory, 0);
+    const std::uint32_t mode = defaults.mode | OCI_THREADED;
+    Environment* const environment = Environment::Open(mode, Environment::SetsOf(mode), defaults.memory, 0);
     if (!environment) return {XAER_RMERR, Error(errors::kOutOfMemory)};
     environment_ = environment;
     auto* const service = Create<ServiceContext>(*environment, OCI_HTYPE_SVCCTX, 0);
