@@ -17,7 +17,7 @@ public:
     Status() = default;    // success
     Status(int code, int number) noexcept : code_(code), number_(number) {}
     Status(int code, int number, std::string detail) : Status(code, number) {
-        if (!detail.empty()) said_ = Pack(new Words{kClient, std::move(detail)}) | kHasWords;
+        if (!detail.empty()) said_ = reinterpret_cast<Packed>(new Words{kClient, std::move(detail)}) | kHasWords;
     }
     Status(const Status& other) noexcept : code_(other.code_), number_(other.number_), said_(other.said_) {
         if (HasWords()) TheWords()->holders.fetch_add(1, std::memory_order_relaxed);
@@ -41,14 +41,14 @@ public:
     // Who says it, in the record's text.
     [[nodiscard]] const char* Engine() const {
         if (HasWords()) return TheWords()->engine;
-        return said_ == 0 ? kClient : static_cast<const char*>(Unpacked());
+        return said_ == 0 ? kClient : reinterpret_cast<const char*>(said_ >> 1);
     }
     [[nodiscard]] bool Plain() const { return said_ == 0; }    // its number says all
 
     // The same status, of which there is no copy yet, as said by an engine: a literal like "SQLITE".
     Status&& From(const char* engine) && {
         if (HasWords()) TheWords()->engine = engine;
-        else said_ = Pack(engine);
+        else said_ = reinterpret_cast<Packed>(engine) << 1;
         return std::move(*this);
     }
 
@@ -60,13 +60,12 @@ private:
         std::atomic<int> holders{1};
     };
 
-    // A pointer beside one bit: addresses of programs leave the topmost bit free.
+    // A pointer beside one bit. That of words is even, and stands as it is, for checkers of leaks to find it; a literal's
+    // leaves the topmost bit free, as addresses of programs do.
     using Packed = std::uintptr_t;
     static constexpr Packed kHasWords = 1;
-    static Packed Pack(const void* pointer) noexcept { return reinterpret_cast<Packed>(pointer) << 1; }
-    [[nodiscard]] void* Unpacked() const noexcept { return reinterpret_cast<void*>(said_ >> 1); }
     [[nodiscard]] bool HasWords() const noexcept { return (said_ & kHasWords) != 0; }
-    [[nodiscard]] Words* TheWords() const noexcept { return static_cast<Words*>(Unpacked()); }
+    [[nodiscard]] Words* TheWords() const noexcept { return reinterpret_cast<Words*>(said_ & ~kHasWords); }
     void LeaveWords() const noexcept {
         if (TheWords()->holders.fetch_sub(1, std::memory_order_acq_rel) == 1) delete TheWords();
     }
