@@ -35,6 +35,28 @@ sword OCILobTrim(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, ub4 newLen);
 sword OCILobWrite(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, ub4 *amount, ub4 offset, dvoid *buf, ub4 bufLen,
                   ub1 piece, dvoid *ctx, OCICallbackLobWrite cb, ub2 csid, ub1 csform);
 
+sword OCILobWriteAppend(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, ub4 *amount, dvoid *buf, ub4 bufLen,
+                        ub1 piece, dvoid *ctx, OCICallbackLobWrite cb, ub2 csid, ub1 csform);
+sword OCILobCharSetForm(OCIEnv *env, OCIError *err, CONST OCILobLocator *lob, ub1 *csform);
+sword OCILobCharSetId(OCIEnv *env, OCIError *err, CONST OCILobLocator *lob, ub2 *csid);
+sword OCILobGetChunkSize(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, ub4 *size);
+sword OCILobLoadFromFile(OCISvcCtx *svc, OCIError *err, OCILobLocator *dst, OCILobLocator *src, ub4 amount,
+                         ub4 dstOffset, ub4 srcOffset);
+
+/* Wide forms. An amount of characters counts before one of bytes; both are told of what was transferred. */
+sword OCILobCopy2(OCISvcCtx *svc, OCIError *err, OCILobLocator *dst, OCILobLocator *src, oraub8 amount,
+                  oraub8 dstOffset, oraub8 srcOffset);
+sword OCILobErase2(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, oraub8 *amount, oraub8 offset);
+sword OCILobGetLength2(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, oraub8 *len);
+sword OCILobRead2(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, oraub8 *bytes, oraub8 *characters, oraub8 offset,
+                  dvoid *buf, oraub8 bufLen, ub1 piece, dvoid *ctx, OCICallbackLobRead2 cb, ub2 csid, ub1 csform);
+sword OCILobTrim2(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, oraub8 newLen);
+sword OCILobWrite2(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, oraub8 *bytes, oraub8 *characters, oraub8 offset,
+                   dvoid *buf, oraub8 bufLen, ub1 piece, dvoid *ctx, OCICallbackLobWrite2 cb, ub2 csid, ub1 csform);
+sword OCILobWriteAppend2(OCISvcCtx *svc, OCIError *err, OCILobLocator *lob, oraub8 *bytes, oraub8 *characters,
+                         dvoid *buf, oraub8 bufLen, ub1 piece, dvoid *ctx, OCICallbackLobWrite2 cb, ub2 csid,
+                         ub1 csform);
+
 /* Files; `hndl` is an environment or a session. Names and paths are NUL-terminated. */
 sword OCIFileInit(dvoid *hndl, OCIError *err);
 sword OCIFileTerm(dvoid *hndl, OCIError *err);

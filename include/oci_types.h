@@ -154,6 +154,10 @@ typedef sb4 (*OCICallbackDefine)(dvoid *ctx, OCIDefine *defnp, ub4 iter,
                                  dvoid **bufpp, ub4 **alenpp, ub1 *piecep, dvoid **indpp, ub2 **rcodepp);
 typedef sb4 (*OCICallbackLobRead)(dvoid *ctx, CONST dvoid *buf, ub4 len, ub1 piece);
 typedef sb4 (*OCICallbackLobWrite)(dvoid *ctx, dvoid *buf, ub4 *lenp, ub1 *piecep);
+typedef sb4 (*OCICallbackLobRead2)(dvoid *ctx, CONST dvoid *buf, oraub8 len, ub1 piece, dvoid **changedBuf,
+                                   oraub8 *changedLen);
+typedef sb4 (*OCICallbackLobWrite2)(dvoid *ctx, dvoid *buf, oraub8 *lenp, ub1 *piecep, dvoid **changedBuf,
+                                    oraub8 *changedLen);
 
 /* A failover callback may be registered with a server; there is no failover, so it is never called. */
 typedef sb4 (*OCICallbackFailover)(dvoid *svc, dvoid *env, dvoid *ctx, ub4 type, ub4 event);

@@ -1,44 +1,62 @@
-// Large objects at the door. A locator is bytes that only the engine reads; the store it came from resolves it. Offsets
-// and lengths are bytes, offsets count from 0; characters are the library's business. What is written is part of the
-// connection's transaction, and visible to it at once.
+// Large objects at the door. Offsets and lengths are bytes and offsets count from 0; characters, gaps, buffers, opening
+// and closing are the library's business.
 //
-// A locator fetched from a column is good until the transaction that it was fetched in ends, or, outside of one, until
-// the connection's next change; one that changes its column's value needs its row locked or written by the transaction.
-// A temporary object lives until it is freed or the connection ends, whatever becomes of transactions. A locator that
-// is neither answers 22275. Copying bytes of a locator makes another name of the same object.
+// A row brings a large object as a Datum of Kind::lob, a view like any other: the store makes a Lob of it, which stays.
+// A Lob of a column reads what the column held when the row was fetched; one that its statement locked or changed
+// (select ... for update, returning) what it holds now, and may be written by the transaction that it was fetched in.
+// What is written is part of that transaction and seen by the next statement of the connection at the latest. What
+// cannot be read any more is refused: 22922 where the row is gone, 22924 where the value of that time is. A temporary
+// object lives as long as somebody holds it, whatever becomes of transactions.
+//
+// Threads: as the connection has it. A Lob may be given up from any thread at any time, even when its connection is
+// gone; any call answers 22275 then, but those on temporary ones.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <span>
-#include <vector>
 
+#include "engine/datum.h"
 #include "handles/status.h"
 
 namespace engine {
 
-enum class LobKind : std::uint8_t { characters, bytes };
-using Locator = std::span<const std::byte>;
+enum class LobKind : std::uint8_t { characters, bytes };    // characters are UTF-8
+constexpr std::byte FillerOf(LobKind kind) { return kind == LobKind::characters ? std::byte{' '} : std::byte{}; }
+
+class Lob {
+public:
+    virtual ~Lob() = default;
+
+    [[nodiscard]] virtual LobKind Kind() const = 0;
+    [[nodiscard]] virtual bool IsTemporary() const = 0;
+    // Whether both are the same object: the same temporary one, or one column of one row.
+    [[nodiscard]] virtual bool IsSame(const Lob& other) const = 0;
+    // Another number each time the bytes may have become others. Nothing that was known of them before holds then.
+    [[nodiscard]] virtual std::uint64_t Version() const = 0;
+
+    virtual Status Length(std::uint64_t& bytes) = 0;
+    // Up to out.size() bytes from `offset` on; `read` is less only at the end, and 0 behind it.
+    virtual Status Read(std::uint64_t offset, std::span<std::byte> out, std::size_t& read) = 0;
+
+    // Whether it may be written now: 22920 when its row is not locked, 22990 when it is of an earlier transaction.
+    virtual Status CheckWrite() = 0;
+    // Over what stands there, and on behind the end; a gap before `offset` is filled with zero bytes or blanks, by kind.
+    // 22925 for more than the engine can hold.
+    virtual Status Write(std::uint64_t offset, std::span<const std::byte> in) = 0;
+    virtual Status Trim(std::uint64_t bytes) = 0;    // to a length that is not above its own
+};
 
 class LobStore {
 public:
     virtual ~LobStore() = default;
-
-    virtual Status CreateTemporary(LobKind kind, std::vector<std::byte>& locator) = 0;
-    virtual Status FreeTemporary(Locator lob) = 0;
-    virtual bool IsTemporary(Locator lob) = 0;
-
-    virtual Status Length(Locator lob, std::uint64_t& bytes) = 0;
-    // Up to out.size() bytes from `offset` on; `read` is less only at the end, and 0 behind it.
-    virtual Status Read(Locator lob, std::uint64_t offset, std::span<std::byte> out, std::size_t& read) = 0;
-    // Over what stands there, and on behind the end; a gap before `offset` is filled as by Erase.
-    virtual Status Write(Locator lob, std::uint64_t offset, std::span<const std::byte> in) = 0;
-    virtual Status Append(Locator lob, std::span<const std::byte> in) = 0;
-    virtual Status Trim(Locator lob, std::uint64_t bytes) = 0;    // to a length that is not above its own
-    // Fills with zero bytes or blanks, by its kind; `erased` is less than `bytes` only at the end.
-    virtual Status Erase(Locator lob, std::uint64_t offset, std::uint64_t bytes, std::uint64_t& erased) = 0;
-    virtual Status Copy(Locator to, std::uint64_t to_offset, Locator from, std::uint64_t from_offset,
-                        std::uint64_t bytes) = 0;
+    virtual Status CreateTemporary(LobKind kind, std::shared_ptr<Lob>& lob) = 0;
+    // Of a value of Kind::lob, while its views hold. `brief`: it is let go before they end, and nothing need be kept.
+    virtual Status Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob) = 0;
 };
+
+// Makes `to` hold what `from` does from there on: `bytes` of it, or as many as there are.
+Status CopyBytes(Lob& from, std::uint64_t from_offset, Lob& to, std::uint64_t to_offset, std::uint64_t bytes);
 
 }  // namespace engine

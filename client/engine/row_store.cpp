@@ -1,16 +1,14 @@
 // Rows in blocks of memory and, beyond a limit, of a temporary file. A row is its Datums, each with its bytes behind it.
 #include "engine/row_store.h"
 
-#include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdlib>
 #include <cstring>
-#include <string>
 #include <type_traits>
 
+#include "engine/chunked_bytes.h"
 #include "handles/errors.h"
 
 namespace engine {
@@ -119,18 +117,7 @@ Status RowStore::NewBlock(std::size_t size) {
     return {};
 }
 
-Status RowStore::OpenFile() {
-    if (file_ >= 0) return {};
-    const char* folder = std::getenv("TMPDIR");
-    const std::string beginning = folder && *folder ? folder : "/tmp";
-    file_ = ::open(beginning.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
-    if (file_ >= 0) return {};
-    std::string name = beginning + "/kelp-rows-XXXXXX";    // the folder's file system may know no unnamed files
-    file_ = ::mkostemp(name.data(), O_CLOEXEC);
-    if (file_ < 0) return FileFailed("no temporary file");
-    ::unlink(name.c_str());
-    return {};
-}
+Status RowStore::OpenFile() { return file_ >= 0 ? Status() : OpenTemporaryFile(file_); }
 
 // The block is given up last, so that one that could not be written stays where it is.
 Status RowStore::Spill(Block& block) {

@@ -13,6 +13,7 @@
 #include "pools/pool_handle.h"
 #include "sessions/service_context.h"
 #include "statements/result_set.h"
+#include "values/lob_descriptor.h"
 #include "values/rowid_descriptor.h"
 
 namespace {
@@ -66,7 +67,7 @@ constexpr Maker kHandles[] = {
 };
 
 constexpr Maker kDescriptors[] = {
-    {OCI_DTYPE_LOB, Make<PlainDescriptor>},
+    {OCI_DTYPE_LOB, Make<LobDescriptor>},
     {OCI_DTYPE_SNAP, Make<Snapshot>},
     {OCI_DTYPE_RSET, Make<ResultSet>},
     {OCI_DTYPE_PARAM, Make<Parameter>},

@@ -28,6 +28,8 @@ constexpr Code kCodes[] = {
     {"OCIConnectionPoolCreate", 100}, {"OCIConnectionPoolDestroy", 101}, {"OCILogon2", 102}, {"OCIRowidToChar", 103},
     {"OCISessionPoolCreate", 104}, {"OCISessionPoolDestroy", 105}, {"OCISessionGet", 106}, {"OCISessionRelease", 107},
     {"OCIStmtPrepare2", 108}, {"OCIStmtRelease", 109}, {"OCIArrayDescriptorAlloc", 127},
+    {"OCILobCopy2", 42}, {"OCILobErase2", 44}, {"OCILobGetLength2", 45}, {"OCILobTrim2", 46}, {"OCILobRead2", 47},
+    {"OCILobWrite2", 48},
     {"OCIStmtFetch2", 28}, {"OCIDefineByPos2", 65}, {"OCIBindByPos2", 66}, {"OCIBindByName2", 67},
 };
 

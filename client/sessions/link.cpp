@@ -32,8 +32,11 @@ void LinkUser::Use(std::shared_ptr<Link> link) noexcept {
 }
 
 Link::Link(bool threaded)
-    : stop_(std::make_shared<engine::StopRequest>()),
-      serial_(threaded ? std::make_shared<std::recursive_mutex>() : nullptr) {}
+    : lobs(std::make_shared<values::LobSession>()),
+      stop_(std::make_shared<engine::StopRequest>()),
+      serial_(threaded ? std::make_shared<std::recursive_mutex>() : nullptr) {
+    lobs->serial = serial_;
+}
 
 void Link::Open(Connected connected) noexcept {
     database_ = std::move(connected.database);
@@ -43,6 +46,7 @@ void Link::Open(Connected connected) noexcept {
     const std::lock_guard lock(cancel_mutex_);
     connection_ = std::move(connected.connection);
     connection_->Obey(stop_);
+    lobs->store = connection_->Lobs();
 }
 
 Link::~Link() { Close(); }
@@ -77,6 +81,15 @@ void Link::Answered(const Status& status) noexcept {
     if (status.Number() == errors::kCancelled) (void)stop_->Take();
 }
 
+namespace {
+
+// Answers whether there were any.
+bool CloseOpened(values::LobSession& lobs) noexcept {
+    return std::erase_if(lobs.opened, [](const auto& opened) { return !opened.lob->IsTemporary(); }) > 0;
+}
+
+}  // namespace
+
 Status Link::CheckBranch(bool ends_transaction) {
     if (!branch) return {};
     return ends_transaction ? Error(errors::kEndsInBranch) : branch->Check(connection_->InTransaction());
@@ -86,13 +99,16 @@ Status Link::Commit() {
     if (branch) return Error(errors::kEndsInBranch);
     Status status = connection_->Commit();
     local_started = local_started && connection_->InTransaction();
-    return status;
+    const bool ended = !connection_->InTransaction();
+    return ended && CloseOpened(*lobs) && status.Ok() ? Warning(errors::kOpenLobsWarning) : status;
 }
 
 Status Link::Rollback() {
     if (branch) return Error(errors::kEndsInBranch);
     local_started = false;
-    return connection_->Rollback();
+    Status status = connection_->Rollback();
+    if (!connection_->InTransaction()) CloseOpened(*lobs);
+    return status;
 }
 
 void Link::DropUsers(void (LinkUser::*told)() noexcept) noexcept {
@@ -108,6 +124,9 @@ std::unique_ptr<engine::Connection> Link::Exchange(std::unique_ptr<engine::Conne
     next->Obey(stop_);
     const std::lock_guard lock(cancel_mutex_);
     connection_.swap(next);
+    lobs->store = connection_->Lobs();
+    lobs->stream = nullptr;
+    CloseOpened(*lobs);
     return next;
 }
 
@@ -128,6 +147,10 @@ Connected Link::TakeApart() noexcept {
     branch.reset();
     spare.reset();
     local_started = false;
+    lobs->store = nullptr;
+    lobs->opened.clear();
+    lobs->buffered.clear();
+    lobs->stream = nullptr;
     const std::lock_guard lock(cancel_mutex_);
     return {database_, user, std::move(place_), std::move(connection_), std::move(statement_cache)};
 }

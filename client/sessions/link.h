@@ -11,6 +11,7 @@
 #include <string>
 
 #include "engine/engine.h"
+#include "values/lob_descriptor.h"
 
 class Link;
 
@@ -120,7 +121,11 @@ public:
     // To be told what an execute or a fetch answered: one that was stopped (1013) has met the wish, which is forgotten.
     void Answered(const Status& status) noexcept;
 
-    // Ends the session's own transaction: 2089 within a branch.
+    // Whether a stop was asked for, which is forgotten.
+    [[nodiscard]] bool TakeCancel() noexcept { return stop_->Take(); }
+
+    // Ends the session's own transaction: 2089 within a branch. What calls opened in it (OCILobOpen) is closed: a commit
+    // that finds something open is a success with information (22297).
     Status Commit();
     Status Rollback();
     // Whether a statement may run that ends transactions, or one that does not.
@@ -142,6 +147,7 @@ public:
     std::unique_ptr<LinkBranch> branch;                  // null: the session's work is its own
     std::unique_ptr<engine::Connection> spare;           // for the next branch that is set aside; in no transaction
     bool local_started = false;                          // an application has begun a transaction of its own
+    const std::shared_ptr<values::LobSession> lobs;    // what the session's locators share
     std::string user;                    // who is logged on; empty: the operating-system user
     std::uint32_t open_statements = 0;    // OCI_ATTR_NUM_OPEN_STMTS
 

@@ -34,6 +34,7 @@ Status BindRows::Collect(const BoundText& text, const sql::EngineText& sql) {
     slots_.reserve(placeholders.size());
     for (const std::uint32_t placeholder : placeholders) {
         BindArea* bind = text.At(placeholder).get();
+        bind->workspace.lobs = text.lobs;
         const sql::Placeholder& named = text.Scanned().placeholders[placeholder];
         const auto first = std::lower_bound(placeholders.begin(), placeholders.end(), named.first);
         auto same_as = static_cast<std::size_t>(first - placeholders.begin());

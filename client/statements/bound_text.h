@@ -59,6 +59,8 @@ public:
 
     Status Describe(const BindInfo& info, const Environment& environment);
 
+    std::shared_ptr<values::LobSession> lobs;    // of the session that the statement runs in
+
 private:
     void Put(std::size_t placeholder, const std::shared_ptr<BindArea>& area, const Object& statement);
     const std::string& KeptName(std::size_t placeholder, bool indicator, const Environment& environment);

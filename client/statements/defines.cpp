@@ -33,7 +33,7 @@ bool Defines::AllLive() const {
     return std::all_of(active_.begin(), active_.end(), [](const Active& active) { return active.area->HasHandle(); });
 }
 
-Status Defines::Activate(const std::vector<engine::Column>& columns) {
+Status Defines::Activate(const std::vector<engine::Column>& columns, const std::shared_ptr<values::LobSession>& lobs) {
     const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
     if (!changed_ && (erased == seen_ || AllLive())) {
         seen_ = erased;
@@ -47,6 +47,7 @@ Status Defines::Activate(const std::vector<engine::Column>& columns) {
         if (!area || !area->HasHandle()) continue;
         if (index >= columns.size()) return Error(errors::kNoSuchColumn);
         area->workspace.column = values::ClassOf(columns[index].type);
+        area->workspace.lobs = lobs;
         Active& active = active_.emplace_back(Active{area, index, {}, {}});
         active.converters = values::ForColumn(*area->Type()->out, area->workspace.column);
         if (area->InPieces()) active.renderers = values::ForColumn(*area->Type()->pieces, area->workspace.column);

@@ -37,7 +37,7 @@ public:
     void Renew() noexcept { changed_ = true; }
     // Finds the column of each define and what converts its values. 1007 for a column that is not there, 24374 when
     // nothing is defined.
-    Status Activate(const std::vector<engine::Column>& columns);
+    Status Activate(const std::vector<engine::Column>& columns, const std::shared_ptr<values::LobSession>& lobs);
     [[nodiscard]] const std::vector<Active>& All() const { return active_; }    // as Activate left them
     [[nodiscard]] bool InPieces() const { return in_pieces_; }                  // some are
     // The number of erased objects when all of them were found living.

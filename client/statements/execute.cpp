@@ -87,7 +87,9 @@ Status Statement::Ready(const ExecuteTarget& target, const ExecuteArguments& arg
     if (target.link != UsedLink()) {
         Drop();
         Use(target.link);
+        defines_.Renew();
     }
+    text_.lobs = target.link->lobs;
     if (run_.fetch_error == errors::kNotConnected) run_.fetch_error = errors::kNotExecuted;
     parse_error_offset_ = Scanned().error_offset;
     if (Scanned().error == 0) return {};
@@ -192,7 +194,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
     const bool was_described = std::exchange(described_, true);
     if (arguments.iterations > 0) {
         if (Status status = CheckRange(arguments); !status.Ok()) return status;
-        if (Status status = defines_.Activate(compiled->query->Columns()); !status.Ok()) return status;
+        if (Status status = defines_.Activate(compiled->query->Columns(), text_.lobs); !status.Ok()) return status;
     }
     const bool scrollable = arguments.mode & OCI_STMT_SCROLLABLE_READONLY;
     if (Status status = compiled->query->Open(compiled->rows, {0, scrollable, prefetch_rows}); !status.Ok()) {
@@ -209,7 +211,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
 // The rows that the execute itself delivers; elements count from the row offset. An exact fetch looks one row further.
 Status Statement::FetchAtExecute(const ExecuteArguments& arguments) {
     const ub4 rows = arguments.iterations - arguments.first;
-    if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) return status;
+    if (Status status = defines_.Activate(run_.cursor.Columns(), UsedLink()->lobs); !status.Ok()) return status;
     Status status = defines_.InPieces() ? StartFetchInPieces(rows, arguments.first, nullptr, &arguments)
                                         : FetchRows(rows, arguments.first, nullptr);
     return EndExactFetch(std::move(status), arguments);

@@ -2,6 +2,7 @@
 #include "handles/errors.h"
 #include "sessions/link.h"
 #include "statements/fetch_sink.h"
+#include "values/lobs.h"
 
 const std::vector<engine::Column>* Statement::Columns() {
     if (run_.cursor.IsOpen()) return &run_.cursor.Columns();
@@ -32,7 +33,7 @@ Status Statement::FetchNow(ub4 rows, ub2 orientation, sb4 offset) {
         run_.fetch_error = errors::kFetchOutOfSequence;
         return {};
     }
-    if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) return status;
+    if (Status status = defines_.Activate(run_.cursor.Columns(), UsedLink()->lobs); !status.Ok()) return status;
     std::uint64_t first = 0;
     const std::uint64_t* position = nullptr;
     if (run_.cursor.Scrollable()) {
@@ -71,9 +72,28 @@ Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> v
     const int error = statement_.defines_.StoreRow(index_, values);
     if (error != 0 && error != errors::kTruncationWarning) return Error(error);
     if (error != 0) warning_ = Warning(error);
-    if (in_pieces_) statement_.pieces_.Begin(index_, values);
-    else ++statement_.run_.rows_fetched;
+    if (in_pieces_) {
+        if (Status status = ReadLobs(values); !status.Ok()) return status;
+        statement_.pieces_.Begin(index_, row_);
+    } else {
+        ++statement_.run_.rows_fetched;
+    }
     ++index_;
+    return {};
+}
+
+// A row that waits outlasts the views of its large objects: those that go in pieces are read.
+Status Statement::FetchSink::ReadLobs(std::span<const engine::Datum> values) {
+    row_.assign(values.begin(), values.end());
+    contents_.resize(values.size());
+    for (const Defines::Active& active : statement_.defines_.All()) {
+        engine::Datum& value = row_[active.column];
+        if (!active.area->InPieces() || value.kind != engine::Kind::lob) continue;
+        std::uint64_t length = 0;
+        const int error = values::ReadLob(values[active.column], statement_.UsedLink()->lobs.get(), values::kWholeLob,
+                                          contents_[active.column], value, length);
+        if (error != 0) return Error(error);
+    }
     return {};
 }
 

@@ -13,8 +13,12 @@ public:
     [[nodiscard]] Status Warned() const { return warning_; }    // 24345 when a value was cut
 
 private:
+    Status ReadLobs(std::span<const engine::Datum> values);
+
     Statement& statement_;
     ub4 index_;
     const bool in_pieces_;
     Status warning_;
+    std::vector<engine::Datum> row_;        // one that goes in pieces: with its large objects read
+    std::vector<std::string> contents_;     // of those, by column
 };

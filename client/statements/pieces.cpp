@@ -35,7 +35,7 @@ Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* p
 
 // Ok when the row is there.
 Status Statement::NextRowInPieces(ub4 row, const std::uint64_t* position) {
-    if (Status status = defines_.Activate(run_.cursor.Columns()); !status.Ok()) {
+    if (Status status = defines_.Activate(run_.cursor.Columns(), UsedLink()->lobs); !status.Ok()) {
         pieces_.End();
         return status;
     }

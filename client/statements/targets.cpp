@@ -11,6 +11,7 @@ Status Targets::FindPlaces(std::size_t columns) {
         if (!text_.IsBound(step_.targets[target])) return Error(errors::kNotAllBound);
         BindArea& bind = *text_.At(step_.targets[target]);
         bind.workspace.column = values::ClassOf(query_.Columns()[target].type);
+        bind.workspace.lobs = text_.lobs;
         Place& place = places_.emplace_back(Place{&bind, values::ForColumn(*bind.Type()->out, bind.workspace.column), {}});
         if (bind.InPieces()) place.renderers = values::ForColumn(*bind.Type()->pieces, bind.workspace.column);
         if (bind.InPieces()) bind.out.clear();

@@ -9,6 +9,7 @@
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <string_view>
 
@@ -20,6 +21,8 @@
 class Environment;
 
 namespace values {
+
+struct LobSession;
 
 // What a select-list column holds, as far as its values convert in their own way.
 enum class ColumnClass : std::uint8_t { plain, number, binary_float, binary_double, date, timestamp, timestamp_zone };
@@ -36,6 +39,8 @@ struct Workspace {
     std::int8_t scale = 0;
     alignas(8) std::array<char, 128> small{};    // numbers, dates, row ids
     std::string text;                   // converted texts and bytes
+    std::string content;                // of a large object
+    std::shared_ptr<LobSession> lobs;   // of the session that the bind or define is used in
     std::string units;                  // text in the application's set
 
     void Use(const CharacterSet& of_application) {

@@ -42,8 +42,9 @@ const ExternalType kTypes[] = {
     {SQLT_IBDOUBLE, Family::real, 8, false, false, FromFlt, &kToFlt, nullptr},
     {SQLT_CUR, Family::cursor, kPointer, false, true, FromNothing, &kToNothing, nullptr},
     {SQLT_RDD, Family::row_id, kPointer, false, true, FromRdd, &kToRdd, nullptr},
-    {SQLT_CLOB, Family::lob, kPointer, false, true, FromNothing, &kToNothing, nullptr},
-    {SQLT_BLOB, Family::lob, kPointer, false, true, FromNothing, &kToNothing, nullptr},
+    {SQLT_CLOB, Family::lob, kPointer, false, true, FromClob, &kToClob, nullptr},
+    {SQLT_BLOB, Family::lob, kPointer, false, true, FromBlob, &kToBlob, nullptr},
+    {SQLT_DBCLOB, Family::lob, kPointer, false, true, FromClob, &kToDbclob, nullptr},
     {SQLT_RSET, Family::cursor, kPointer, false, true, FromNothing, &kToNothing, nullptr},
     {SQLT_VST, Family::text, kPointer, false, true, FromString, &kToString, nullptr},
     {SQLT_ODT, Family::date, sizeof(OCIDate), false, false, FromOdt, &kToOdt, nullptr},
@@ -147,7 +148,7 @@ engine::Kind KindOf(const ExternalType& type, std::uint32_t size) {
         case Family::real: return engine::Kind::real;
         case Family::date: return engine::Kind::timestamp;
         case Family::row_id: return engine::Kind::row_id;
-        case Family::lob: return engine::Kind::lob;
+        case Family::lob: return type.code == SQLT_BLOB ? engine::Kind::bytes : engine::Kind::text;
         case Family::cursor: return engine::Kind::cursor;
     }
     return engine::Kind::null;

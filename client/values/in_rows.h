@@ -26,6 +26,8 @@ int FromString(const Source&, Workspace&, engine::Datum&);      // OCIString*
 int FromRaw(const Source&, Workspace&, engine::Datum&);         // OCIRaw*
 int FromDatetime(const Source&, Workspace&, engine::Datum&);    // OCIDateTime*
 int FromRdd(const Source&, Workspace&, engine::Datum&);         // OCIRowid*
+int FromClob(const Source&, Workspace&, engine::Datum&);        // OCILobLocator*
+int FromBlob(const Source&, Workspace&, engine::Datum&);
 int FromNull(const Source&, Workspace&, engine::Datum&);        // null, whatever stands there
 int FromNothing(const Source&, Workspace&, engine::Datum&);     // no conversion: 932
 

@@ -12,6 +12,7 @@
 #include "number/number.h"
 #include "oci.h"
 #include "platform/utf.h"
+#include "values/lobs.h"
 #include "values/out_rows.h"
 #include "values/rowid.h"
 
@@ -324,18 +325,51 @@ int PutVbi(View bytes, Workspace&, Target& target) {
     return LayPrefixed<std::uint16_t>(bytes, std::min(bytes.size(), PrefixedRoom<std::uint16_t>(target)), target);
 }
 
+// ---- Large objects, as far as an element takes them
+
+// `text`: as text, else as bytes.
+int LobForm(const Datum& value, bool as_text, Workspace& workspace, View& form) {
+    if (as_text) return value.kind == engine::Kind::text ? OwnText(value, workspace, form) : HexText(value, workspace, form);
+    return value.kind == engine::Kind::text ? BytesOfHex(value, workspace, form) : OwnText(value, workspace, form);
+}
+
+template <bool as_text>
+int WholeLob(const Datum& datum, Workspace& workspace, View& form) {
+    Datum value;
+    std::uint64_t length = 0;
+    if (const int error = ReadLob(datum, workspace.lobs.get(), kWholeLob, workspace.content, value, length)) return error;
+    return LobForm(value, as_text, workspace, form);
+}
+
+// No more is read than an area of that size can show, where the whole length is known without. Objects take all.
+template <auto put, bool as_text>
+int PutLob(const Datum& datum, Workspace& workspace, Target& target) {
+    constexpr bool is_object = put == PutString || put == PutRaw;
+    const std::uint64_t most = is_object || workspace.set ? kWholeLob : 2 * std::uint64_t{target.size} + 8;
+    Datum value;
+    std::uint64_t length = 0;
+    if (const int error = ReadLob(datum, workspace.lobs.get(), most, workspace.content, value, length)) return error;
+    View form;
+    if (const int error = LobForm(value, as_text, workspace, form)) return error;
+    const int error = put(form, workspace, target);
+    const bool is_hex = as_text && value.kind != engine::Kind::text;
+    const bool is_unhexed = !as_text && value.kind == engine::Kind::text;
+    if (length > value.length) target.whole = is_hex ? length * 2 : is_unhexed ? (length + 1) / 2 : length;
+    return error;
+}
+
 template <auto put>
 constexpr ByOrigin<OutConverter> kTextRow = {
     NoConversion,                    Through<View, IntegerText, put>, Through<View, RealText, put>,
     Through<View, DecimalText, put>, Through<View, OwnText, put>,     Through<View, HexText, put>,
-    Through<View, TimestampText, put>, NoConversion,                  Through<View, RowIdText, put>,
+    Through<View, TimestampText, put>, PutLob<put, true>,             Through<View, RowIdText, put>,
     NoConversion,                    Through<View, NumericText, put>, Through<View, BinaryRealText, put>,
     Through<View, SingleRealText, put>, Through<View, DateText, put>};
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kBytesRow = {
     NoConversion, NoConversion, NoConversion, NoConversion, Through<View, BytesOfHex, put>, Through<View, OwnText, put>,
-    NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
+    NoConversion, PutLob<put, false>, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion, NoConversion};
 
 }  // namespace
 
@@ -359,9 +393,9 @@ const ByOrigin<OutConverter> kToVbi = kBytesRow<PutVbi>;
 const ByOrigin<OutConverter> kToRaw = kBytesRow<PutRaw>;
 
 const ByOrigin<Renderer> kWholeText = {NoText, IntegerText, RealText, DecimalText, OwnText, HexText,
-                                       TimestampText, NoText, RowIdText, NoText, NumericText, BinaryRealText, SingleRealText,
+                                       TimestampText, WholeLob<true>, RowIdText, NoText, NumericText, BinaryRealText, SingleRealText,
                                        DateText};
 const ByOrigin<Renderer> kWholeBytes = {NoText, NoText, NoText, NoText, BytesOfHex, OwnText,
-                                        NoText, NoText, NoText, NoText, NoText, NoText, NoText, NoText};
+                                        NoText, WholeLob<false>, NoText, NoText, NoText, NoText, NoText, NoText};
 
 }  // namespace values

@@ -99,6 +99,7 @@ Status SqliteConnection::Make(std::shared_ptr<Home> home, std::shared_ptr<const 
 // Closing rolls back, as does giving the handle back.
 SqliteConnection::~SqliteConnection() {
     if (!handle_.database) return;
+    lobs_.Close();
     for (StatementHandle& own : owns_) own.reset();
     sqlite3_busy_handler(Database(), nullptr, nullptr);
     sqlite3_progress_handler(Database(), 0, nullptr, nullptr);
@@ -170,11 +171,13 @@ Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint
     if (code != SQLITE_OK) return Failure(database, code);
 
     if (Status status = FindValueTargets(database, sql, made.targets); status.Failed()) return status;
+    if (utf8_) made.lobs = FindLobItems(database, made.statement.get(), sql, lobs_, made.targets);
     const std::string rewritten = made.targets.Rewritten(sql);
     if (rewritten.empty()) return {};
     StatementHandle checked = CompileText(rewritten, code, nullptr);
     if (code != SQLITE_OK) return Failure(database, code);
-    made.statement = std::move(checked);
+    std::swap(made.statement, checked);
+    if (!made.lobs.empty()) made.as_written = std::move(checked);
     return {};
 }
 
@@ -241,6 +244,7 @@ Status SqliteConnection::Begin(TransactionMode mode) {
     (void)ReadAhead(nullptr);
     read_only_ = mode == TransactionMode::read_only;
     changes_before_ = sqlite3_total_changes64(Database());
+    lobs_.TransactionBegins();
     if (mode == TransactionMode::read_write) return Run(Own::begin);
     Status status = Run(Own::begin_reading);
     return status.Ok() ? LookOrEnd() : status;
@@ -258,6 +262,10 @@ Status SqliteConnection::LookOrEnd() {
 Status SqliteConnection::Commit() {
     if (!InTransaction()) return {};
     const Unheeding undisturbed(*this);
+    if (Status settled = lobs_.Settle(); settled.Failed()) {
+        const Status undone = Rollback();
+        return undone.Failed() ? undone : RolledBack(settled);
+    }
     Status status = Run(Own::commit);
     if (status.Number() != errors::kParentMissing && status.Number() != errors::kChildFound) return status;
     Status undone = Rollback();
@@ -268,6 +276,7 @@ Status SqliteConnection::Rollback() {
     if (!InTransaction()) return {};
     const Unheeding undisturbed(*this);
     (void)ReadAhead(nullptr);
+    lobs_.Forget();
     return Run(Own::rollback);
 }
 
@@ -275,6 +284,7 @@ Status SqliteConnection::SetMark() {
     for (const Own own : {Own::undo, Own::drop}) {
         if (Status status = CompileOwn(own); status.Failed()) return status;
     }
+    if (Status status = Settle(); status.Failed()) return status;
     Status status = Begin(TransactionMode::read_write);
     return status.Ok() ? Run(Own::mark) : status;
 }
@@ -284,6 +294,7 @@ Status SqliteConnection::UndoToMark() {
     const bool in_transaction = InTransaction();
     const Status read = ReadAhead(nullptr);
     if (in_transaction && !InTransaction()) return RolledBack(read);
+    lobs_.Forget();
     Status status = Run(Own::undo);
     if (status.Ok() || status.Number() == errors::kNoSuchSavepoint) return status;
     Status undone = Rollback();
@@ -315,6 +326,7 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
     began = false;
     broken_ = broken_ || !home_->Unchanged(handle_);
     if (broken_) return Error(errors::kEndOfChannel, "the read-only file has changed").From("SQLITE");
+    if (Status status = Settle(); status.Failed()) return status;
     if (entry.effect == Effect::defines) {
         if (Status status = Commit(); status.Failed()) return status;
     }
@@ -334,6 +346,17 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
     return in_transaction && !InTransaction() ? RolledBack(read) : Status();
 }
 
+// What large objects were given becomes their values: nothing stops that half-way.
+Status SqliteConnection::Settle() {
+    const Unheeding undisturbed(*this);
+    return lobs_.Settle();
+}
+
+void SqliteConnection::Defined() noexcept {
+    ++schema_.definitions;
+    lobs_.Defined();
+}
+
 void SqliteConnection::Abandon() noexcept { (void)Rollback(); }    // nothing is lost: there was nothing yet
 
 // ---- Open queries
@@ -349,6 +372,7 @@ void SqliteConnection::Leave(SqliteQuery& query) noexcept {
     else if (first_open_ == &query) first_open_ = query.next_open_;
     if (query.next_open_) query.next_open_->previous_ = query.previous_;
     query.previous_ = query.next_open_ = nullptr;
+    lobs_.LetGo();
 }
 
 Status SqliteConnection::ReadAhead(const SqliteQuery* except) noexcept {
@@ -377,8 +401,10 @@ int SqliteConnection::OnBusy(void* self, int attempts) {
     return 1;
 }
 
-void SqliteConnection::OnChange(void* self, int, const char*, const char* table, sqlite3_int64 row) {
+void SqliteConnection::OnChange(void* self, int operation, const char*, const char* table, sqlite3_int64 row) {
     auto& connection = *static_cast<SqliteConnection*>(self);
+    ++connection.told_changes_;
+    connection.lobs_.RowChanged(operation, table, row);
     if (connection.changed_table && std::strcmp(connection.changed_table->c_str(), table) == 0)
         connection.changed_row = row;
 }

@@ -14,6 +14,8 @@
 #include "engine/engine.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/home.h"
+#include "engine/sqlite/lob_columns.h"
+#include "engine/sqlite/lob_store.h"
 #include "engine/sqlite/value_targets.h"
 
 namespace engine::sqlite {
@@ -32,6 +34,8 @@ struct Compilation {
     StatementHandle statement;
     ValueTargets targets;
     std::string table;    // that it changes; those of triggers and cascades are others
+    std::vector<LobItem> lobs;          // of its list
+    StatementHandle as_written;         // of one with lobs: what its columns are called and declared as
     Schema schema;
 };
 
@@ -64,7 +68,7 @@ public:
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { stop_ = std::move(stop); }
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
     Status UseSchema(std::string& schema) override;
-    LobStore* Lobs() override { return nullptr; }
+    engine::LobStore* Lobs() override { return &lobs_; }
     Status Ping() override;
     [[nodiscard]] bool Broken() const override { return broken_; }
     void Interrupt() noexcept override {}    // a call looks at the request by itself, again and again
@@ -87,7 +91,7 @@ public:
     // The tables as they are for a statement that runs now: inside a transaction as this one sees them, else as they
     // were when the connection last looked at the file, or later.
     Status SeeSchema(Schema& schema);
-    void Defined() noexcept { ++schema_.definitions; }    // a definition has run
+    void Defined() noexcept;    // a definition has run
 
     // What a statement needs to run.
     struct Entry {
@@ -104,6 +108,10 @@ public:
     // Lets the open queries but `except` read the rest of their rows, so that none holds an old state of the database.
     // The first failure, of which the fetch that gets there is told: of interest if it has lost the transaction.
     Status ReadAhead(const SqliteQuery* except) noexcept;
+    [[nodiscard]] bool HasOpenQueries() const { return first_open_ != nullptr; }
+    [[nodiscard]] LobStore& LobsOfTables() { return lobs_; }
+    // How many changes of rows the connection was told of.
+    [[nodiscard]] std::uint64_t ToldChanges() const { return told_changes_; }
     // The last row that was changed in a table, for whoever said which one and emptied it before.
     std::optional<std::int64_t> changed_row;
     const std::string* changed_table = nullptr;
@@ -141,6 +149,7 @@ private:
     Status CompileOwn(Own own) noexcept;
     Status Run(Own own) noexcept;
     Status LookOrEnd();
+    Status Settle();
     std::string Encoding();
 
     std::shared_ptr<Home> home_;
@@ -158,6 +167,8 @@ private:
     std::optional<unsigned> data_version_;
     std::chrono::steady_clock::time_point busy_since_;
     SqliteQuery* first_open_ = nullptr;
+    std::uint64_t told_changes_ = 0;
+    LobStore lobs_{*this};
 };
 
 }  // namespace engine::sqlite

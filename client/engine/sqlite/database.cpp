@@ -43,8 +43,8 @@ public:
 
     [[nodiscard]] const Dialect& GetDialect() const override;
     [[nodiscard]] const Capabilities& GetCapabilities() const override {
-        static constexpr Capabilities kNone{};
-        return kNone;
+        static constexpr Capabilities kAble{.lobs = true};
+        return kAble;
     }
     std::string Version() override;
     [[nodiscard]] std::string Identity() const override { return home_->Private() ? "" : home_->File(); }

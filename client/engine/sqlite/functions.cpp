@@ -152,7 +152,13 @@ void Coerce(sqlite3_context* context, int, Arguments arguments) {
     }
 }
 
+// Large objects without anything in them are no nulls.
+void EmptyClob(sqlite3_context* context, int, Arguments) { sqlite3_result_text(context, "", 0, SQLITE_STATIC); }
+void EmptyBlob(sqlite3_context* context, int, Arguments) { sqlite3_result_zeroblob(context, 0); }
+
 constexpr FunctionRow kFunctionRows[] = {
+    {"empty_clob", 0, 0, SQLITE_DETERMINISTIC, EmptyClob, "clob"},
+    {"empty_blob", 0, 0, SQLITE_DETERMINISTIC, EmptyBlob, "blob"},
     {"kelp_number", 1, 3, SQLITE_DETERMINISTIC, ToNumber},
     {"kelp_decfloat", 1, 2, SQLITE_DETERMINISTIC, ToDecimalFloat},
     {"kelp_binary_float", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBFLOAT>},

@@ -41,6 +41,8 @@ SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, 
       statement_(std::move(compilation.statement)),
       table_(std::move(compilation.table)),
       schema_(compilation.schema),
+      lobs_(std::move(compilation.lobs)),
+      as_written_(std::move(compilation.as_written)),
       sql_(sql),
       verb_(VerbOf(sql_)),
       entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && IsSavepoint(sql)},
@@ -68,6 +70,8 @@ Status SqliteQuery::FollowSchema() {
     coercions_ = CoercionsOf(made.targets, parameters_.size());
     statement_ = std::move(made.statement);
     table_ = std::move(made.table);
+    lobs_ = std::move(made.lobs);
+    as_written_ = std::move(made.as_written);
     schema_ = made.schema;
     described_ = false;
     return {};
@@ -91,7 +95,8 @@ void SqliteQuery::Describe() {
     columns_.clear();
     untyped_.clear();
     if (sqlite3_column_count(statement_.get()) > 0) {
-        DescribeColumns(connection_.Database(), statement_.get(), sql_, columns_, untyped_);
+        sqlite3_stmt* const described = as_written_ ? as_written_.get() : statement_.get();
+        DescribeColumns(connection_.Database(), described, sql_, columns_, untyped_);
     }
     any_untyped_ = std::find(untyped_.begin(), untyped_.end(), true) != untyped_.end();
     PlanReading();
@@ -107,6 +112,8 @@ SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
         case SQLT_BIN:
         case SQLT_LBI:
         case SQLT_BLOB: return Reading::bytes;
+        case SQLT_CLOB:
+        case SQLT_DBCLOB: return Reading::characters;    // long ones are kept as blobs
         default: return Reading::as_stored;
     }
 }
@@ -114,6 +121,7 @@ SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
 void SqliteQuery::PlanReading() {
     readings_.clear();
     for (const Column& column : columns_) readings_.push_back(ReadingOf(column));
+    for (const LobItem& lob : lobs_) readings_[lob.index] = Reading::lob;
     rooms_.resize(columns_.size());
     values_.resize(columns_.size());
 }
@@ -231,8 +239,11 @@ Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* re
         status = RunReturning(row, *returned);
     } else {
         bool has_row = true;
+        const std::uint64_t told = connection_.ToldChanges();
         while (has_row && status.Ok()) status = Step(has_row);
         sqlite3_reset(statement_.get());
+        // "delete from t" deletes all rows at once and tells of none.
+        if (verb_ == Verb::remove && connection_.ToldChanges() == told) connection_.LobsOfTables().RowsGone();
     }
     if (status.Ok() && verb_ != Verb::other) {
         affected += static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));

@@ -1,6 +1,7 @@
 // One compiled SQLite statement: array executions with borrowed values, and a query's rows as views.
 #pragma once
 
+#include <deque>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -46,13 +47,14 @@ private:
         drained      // the rows to come are in store_, with end_ behind them
     };
     // How a value of a column is handed out.
-    enum class Reading : std::uint8_t { as_stored, number, padded, date, row_id, bytes };
+    enum class Reading : std::uint8_t { as_stored, number, padded, date, row_id, bytes, characters, lob };
     // Room for a column's value that SQLite keeps in another form.
     struct Room {
         OCINumber number;
         date::DateTime date;
         RowId row;
         std::string padded;
+        LobView lob;
     };
 
     using Coercions = std::vector<std::unique_ptr<Coercion>>;
@@ -79,6 +81,8 @@ private:
     void FillRowId(int column, Datum& value);
     void FillDate(int column, Datum& value);
     void FillNumber(int column, Datum& value);
+    void FillLob(int column, Datum& value);
+    Status KeepLobs();
     void Pad(int index, Datum& value);
 
     static Reading ReadingOf(const Column& column);
@@ -91,6 +95,8 @@ private:
     StatementHandle statement_;
     std::string table_;    // that it changes
     Schema schema_;        // that it is compiled for
+    std::vector<LobItem> lobs_;    // columns that come as numbers of rows
+    StatementHandle as_written_;
     std::string sql_;
     Verb verb_;
     SqliteConnection::Entry entry_;
@@ -109,6 +115,7 @@ private:
     std::vector<Datum> values_;          // the row at hand
 
     bool scrollable_ = false;
+    std::deque<std::shared_ptr<Lob>> kept_lobs_;    // of rows in the store
     RowStore store_;                     // rows read ahead; of a scrollable query every row that was reached
     std::uint64_t next_ = 0;             // the row of the store that comes next
     Status end_;                         // what comes behind the last row

@@ -118,8 +118,11 @@ Status SqliteQuery::KeepRow() {
         state_ = State::on_row;
     }
     Fill();
-    Status status = store_.Add(values_);
+    const std::size_t kept = kept_lobs_.size();
+    Status status = lobs_.empty() ? Status() : KeepLobs();
+    if (status.Ok()) status = store_.Add(values_);
     if (status.Ok()) state_ = State::stepping;
+    else kept_lobs_.resize(kept);
     return status;
 }
 
@@ -178,6 +181,7 @@ void SqliteQuery::Close() noexcept {
     if (state_ != State::drained) Drain({});
     sqlite3_clear_bindings(statement_.get());
     store_.Clear();
+    kept_lobs_.clear();
     state_ = State::closed;
     end_ = {};
     next_ = 0;
@@ -200,6 +204,7 @@ void SqliteQuery::Fill() {
                 value->length = 0;
                 value->integer = sqlite3_value_int64(stored);
                 if (*reading == Reading::row_id) FillRowId(index, *value);
+                if (*reading == Reading::lob) FillLob(index, *value);
                 break;
             case SQLITE_FLOAT:
                 value->kind = Kind::real;
@@ -220,7 +225,8 @@ void SqliteQuery::Fill() {
                 value->data = sqlite3_value_blob(stored);
                 value->length = static_cast<std::uint32_t>(sqlite3_value_bytes(stored));
                 if (!value->data && value->length > 0) throw std::bad_alloc();
-                if (*reading != Reading::bytes) FillNumber(index, *value);
+                if (*reading == Reading::characters) value->kind = Kind::text;
+                else if (*reading != Reading::bytes) FillNumber(index, *value);
                 break;
             default: *value = {}; break;
         }
@@ -243,6 +249,27 @@ void SqliteQuery::FillDate(int column, Datum& value) {
 void SqliteQuery::FillNumber(int column, Datum& value) {
     OCINumber& number = rooms_[static_cast<std::size_t>(column)].number;
     if (ReadNumberBlob(value.Text(), number)) SetView(value, Kind::decimal, &number, sizeof number);
+}
+
+void SqliteQuery::FillLob(int index, Datum& value) {
+    const auto column = static_cast<std::size_t>(index);
+    const auto item = std::find_if(lobs_.begin(), lobs_.end(), [&](const LobItem& lob) { return lob.index == column; });
+    LobView& view = rooms_[column].lob;
+    view = {&item->column, value.integer, entry_.effect != Effect::reads, nullptr};
+    SetView(value, Kind::lob, &view, sizeof view);
+}
+
+// The large objects of a row that is read ahead are copied as they are now.
+Status SqliteQuery::KeepLobs() {
+    for (const LobItem& lob : lobs_) {
+        if (values_[lob.index].kind != Kind::lob) continue;
+        std::shared_ptr<Lob>& kept = kept_lobs_.emplace_back();
+        Status status = connection_.LobsOfTables().Take(values_[lob.index], true, kept);
+        if (status.Ok()) status = connection_.LobsOfTables().Keep(kept);
+        if (status.Failed()) return status;
+        rooms_[lob.index].lob.kept = &kept;
+    }
+    return {};
 }
 
 // A fixed column's texts have its length, in characters or bytes.

@@ -828,6 +828,167 @@ TEST_P(Contract, TablesAndViewsAreDescribedAsTheirRowsAre) {
     for (const auto& c : missing) EXPECT_EQ(Answer(connection_->Describe(c.name, c.kind, object)), c.number) << c.name;
 }
 
+// ---- Large objects, of the engines that have them
+
+class LobContract : public Contract {
+protected:
+    using Kept = std::shared_ptr<engine::Lob>;
+
+    // Takes the large objects of the rows that come.
+    struct Taking : engine::RowSink {
+        engine::LobStore& store;
+        std::vector<Kept> lobs;
+        int number = 0;
+        explicit Taking(engine::LobStore& from) : store(from) {}
+        Status Row(std::uint32_t, std::span<const Datum> values) override {
+            if (values[0].kind == Kind::null) return {};
+            EXPECT_EQ(values[0].kind, Kind::lob);
+            number = Answer(store.Take(values[0], false, lobs.emplace_back()));
+            return {};
+        }
+    };
+    void SetUp() override {
+        Contract::SetUp();
+        ASSERT_TRUE(database_->GetCapabilities().lobs);
+        ASSERT_EQ(Run("create table l(k integer, c clob)"), 0);
+        ASSERT_EQ(Run("insert into l values(1, 'one')"), 0);
+        ASSERT_EQ(Run("insert into l values(2, null)"), 0);
+        ASSERT_EQ(Run("insert into l values(3, 'three')"), 0);
+        ASSERT_EQ(Answer(connection_->Commit()), 0);
+    }
+    Kept Fetch(engine::Connection& connection, const char* sql, Effect effect) {
+        std::unique_ptr<engine::Query> query;
+        std::uint32_t offset = 0;
+        EXPECT_EQ(Answer(connection.Compile({sql, effect, {}}, query, offset)), 0) << sql;
+        ::Rows none;
+        Taking rows(*connection.Lobs());
+        if (effect == Effect::changes) {
+            engine::ArrayOutcome outcome;
+            EXPECT_EQ(Answer(query->ExecuteArray(none, {0, 1, false, &rows}, outcome)), 0);
+        } else {
+            bool more = true;
+            EXPECT_EQ(Answer(query->Open(none, {})), 0);
+            EXPECT_EQ(Answer(query->Fetch(rows, 100, more)), 0);
+        }
+        EXPECT_EQ(rows.number, 0);
+        return rows.lobs.empty() ? nullptr : rows.lobs.front();
+    }
+    Kept Locked(const char* sql = "select c from l where k = 3") { return Fetch(*connection_, sql, Effect::locks); }
+    Kept Plain(const char* sql = "select c from l where k = 3") { return Fetch(*connection_, sql, Effect::reads); }
+    static int Write(engine::Lob& lob, std::uint64_t offset, std::string_view text) {
+        return Answer(lob.Write(offset, std::as_bytes(std::span(text))));
+    }
+    // All of it, or its error.
+    static std::string Read(engine::Lob& lob, std::uint64_t offset = 0) {
+        std::string text(100, '#');
+        std::size_t read = 0;
+        const Status status = lob.Read(offset, std::as_writable_bytes(std::span(text)), read);
+        return status.Ok() ? text.substr(0, read) : "error " + std::to_string(status.Number());
+    }
+    std::string Stored() {
+        std::unique_ptr<engine::Query> query = Prepared("select k, c || '' from l where c is not null order by k");
+        ::Rows none;
+        EXPECT_EQ(Answer(query->Open(none, {})), 0);
+        return Rest(*query);
+    }
+};
+
+TEST_P(LobContract, LockedOneIsWrittenAndSeenByTheNextStatement) {
+    const Kept lob = Locked();
+    EXPECT_EQ(Read(*lob, 2) + Read(*lob, 5) + Read(*lob, 99), "ree");
+    EXPECT_EQ(Write(*lob, 0, "TH"), 0);                        // in place
+    EXPECT_EQ(Write(*lob, 5, " and four"), 0);                 // grows
+    EXPECT_EQ(Read(*lob), "THree and four");
+    EXPECT_EQ(Stored(), "1,one;3,THree and four;");
+    EXPECT_EQ(Answer(lob->Trim(2)), 0);
+    std::uint64_t length = 0;
+    EXPECT_EQ(Answer(lob->Length(length)), 0);
+    EXPECT_EQ(length, 2u);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    EXPECT_EQ(Stored(), "1,one;3,TH;");
+    EXPECT_EQ(Write(*lob, 0, "x"), 22990);
+}
+
+TEST_P(LobContract, WritesGoWithTheTransactionAndItsMarks) {
+    Kept lob = Locked();
+    ASSERT_EQ(Write(*lob, 5, "-first"), 0);
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    ASSERT_EQ(Write(*lob, 11, "-second"), 0);
+    ASSERT_EQ(Write(*lob, 0, "T"), 0);
+    ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
+    EXPECT_EQ(Read(*lob), "three-first");
+    EXPECT_EQ(Stored(), "1,one;3,three-first;");
+    ASSERT_EQ(Write(*lob, 0, "T"), 0);
+    ASSERT_EQ(Write(*lob, 11, "!"), 0);
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(Stored(), "1,one;3,three;");
+}
+
+TEST_P(LobContract, OneThatIsNotLockedIsReadOnlyAndWhatItWas) {
+    EXPECT_EQ(Write(*Plain(), 0, "x"), 22920);
+    Kept lob = Plain();
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
+    const Kept inside = Plain();
+    EXPECT_EQ(Write(*inside, 0, "x"), 22920);
+    ASSERT_EQ(Run("update l set c = 'other' where k = 3"), 0);
+    EXPECT_EQ(Read(*inside), "error 22924");
+    EXPECT_EQ(Read(*lob), GetParam().shared ? "three" : "error 22924");
+    EXPECT_EQ(Write(*Plain(), 0, "O"), 0);                     // the transaction has written the row
+    const Kept returned = Fetch(*connection_, "update l set c = 'new' where k = 1 returning c", Effect::changes);
+    EXPECT_EQ(Write(*returned, 3, "er"), 0);
+    EXPECT_EQ(Stored(), "1,newer;3,Other;");
+}
+
+TEST_P(LobContract, RowThatIsGoneHasNoValue) {
+    Kept lob = Locked();
+    ASSERT_EQ(Run("delete from l where k = 3"), 0);
+    EXPECT_EQ(Read(*lob), "error 22922");
+    ASSERT_EQ(Run("insert into l values(4, 'its number')"), 0);
+    EXPECT_EQ(Read(*lob), "error 22922");
+    EXPECT_EQ(Write(*lob, 0, "x"), 22922);
+    lob = Locked("select c from l where k = 4");
+    ASSERT_EQ(Run("delete from l"), 0);
+    EXPECT_NE(Read(*lob), "its number");
+    EXPECT_EQ(Plain("select c from l"), nullptr);
+    connection_.reset();
+    EXPECT_EQ(Read(*lob), "error 22275");
+    EXPECT_EQ(Write(*lob, 0, "x"), 22275);
+}
+
+TEST_P(LobContract, OpenQueryKeepsItsValuesWhileOthersAreWritten) {
+    std::unique_ptr<engine::Query> query;
+    std::uint32_t offset = 0;
+    ASSERT_EQ(Answer(connection_->Compile({"select c from l order by k", Effect::locks, {}}, query, offset)), 0);
+    ::Rows none;
+    Taking rows(*connection_->Lobs());
+    bool more = true;
+    ASSERT_EQ(Answer(query->Open(none, {})), 0);
+    ASSERT_EQ(Answer(query->Fetch(rows, 1, more)), 0);
+    ASSERT_EQ(Write(*rows.lobs[0], 3, " more"), 0);
+    ASSERT_EQ(Answer(query->Fetch(rows, 10, more)), 0);
+    ASSERT_EQ(rows.lobs.size(), 2u);
+    EXPECT_EQ(Read(*rows.lobs[0]) + Read(*rows.lobs[1]), "one morethree");
+    EXPECT_EQ(Write(*rows.lobs[1], 5, "!"), 0);
+    EXPECT_TRUE(rows.lobs[1]->IsSame(*Locked()));
+    EXPECT_FALSE(rows.lobs[1]->IsSame(*rows.lobs[0]));
+    EXPECT_EQ(Stored(), "1,one more;3,three!;");
+}
+
+TEST_P(LobContract, TemporaryOneOutlivesTransactionsAndConnection) {
+    Kept lob;
+    ASSERT_EQ(Answer(connection_->Lobs()->CreateTemporary(engine::LobKind::bytes, lob)), 0);
+    std::string text;
+    for (int number = 0; text.size() < 200000; ++number) text += std::to_string(number);
+    for (std::size_t at = 0; at < text.size(); at += 7777)
+        ASSERT_EQ(Write(*lob, at, std::string_view(text).substr(at, 7777)), 0);
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    connection_.reset();
+    ASSERT_EQ(Answer(lob->Trim(150000)), 0);
+    for (const std::size_t at : {0, 4095, 65530, 131070, 149990})
+        EXPECT_EQ(Read(*lob, at), text.substr(at, std::min<std::size_t>(100, 150000 - at))) << at;
+    EXPECT_TRUE(lob->IsTemporary());
+}
+
 std::string FreshFile(const std::string& folder) { return folder + "/test.db"; }
 std::string InMemory(const std::string&) { return ":memory:"; }
 
@@ -837,6 +998,7 @@ constexpr Engine kPostgres{"Postgres", nullptr, true};
 std::string NameOf(const testing::TestParamInfo<Engine>& info) { return info.param.name; }
 
 INSTANTIATE_TEST_SUITE_P(Engines, Contract, testing::Values(kSqliteFile, kSqliteMemory, kPostgres), NameOf);
+INSTANTIATE_TEST_SUITE_P(Engines, LobContract, testing::Values(kSqliteFile, kSqliteMemory), NameOf);
 INSTANTIATE_TEST_SUITE_P(Engines, SharedContract, testing::Values(kSqliteFile, kPostgres), NameOf);
 
 }  // namespace

@@ -306,7 +306,7 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
         {Raw(ub8{698} << 53 | 1), SQLT_BFLOAT, -1, "!1426"},    // 1E300
         {Raw(ub8{0x78} << 56), SQLT_BFLOAT, -1, "!1426"}, {Raw(ub8{0x7C} << 56), SQLT_BFLOAT, -1, "!1722"},
-        {std::string(8, '\0'), SQLT_CLOB, -1, "!932"}, {std::string(8, '\0'), SQLT_CUR, -1, "!932"},
+        {std::string(8, '\0'), SQLT_CLOB, -1, "!22275"}, {std::string(8, '\0'), SQLT_CUR, -1, "!932"},
         {std::string(8, '\0'), SQLT_RDD, -1, "!21710"},
     };
     for (const auto& c : cases) {

@@ -1,0 +1,219 @@
+// Chunks of a temporary file, and bytes put together from them.
+#include "engine/chunked_bytes.h"
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+#include "handles/errors.h"
+
+namespace engine {
+namespace {
+
+Status FileFailed(const char* words) {
+    const bool full = errno == ENOSPC || errno == EDQUOT || errno == EFBIG;
+    return Error(full ? errors::kNoRoom : errors::kInputOutputError, words);
+}
+
+// A transfer that is cut short goes on; `move` answers like pwrite.
+template <class Move>
+bool All(std::size_t size, Move move) {
+    for (std::size_t done = 0; done < size;) {
+        errno = 0;
+        const ssize_t moved = move(done);
+        if (moved <= 0) {
+            if (moved < 0 && errno == EINTR) continue;
+            return false;
+        }
+        done += static_cast<std::size_t>(moved);
+    }
+    return true;
+}
+
+off_t Place(std::uint32_t chunk, std::size_t at) { return static_cast<off_t>(std::uint64_t{chunk} * ChunkFile::kChunk + at); }
+
+}  // namespace
+
+Status OpenTemporaryFile(int& file) {
+    const char* folder = std::getenv("TMPDIR");
+    const std::string beginning = folder && *folder ? folder : "/tmp";
+    file = ::open(beginning.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
+    if (file >= 0) return {};
+    std::string name = beginning + "/kelp-rows-XXXXXX";    // the folder's file system may know no unnamed files
+    file = ::mkostemp(name.data(), O_CLOEXEC);
+    if (file < 0) return FileFailed("no temporary file");
+    ::unlink(name.c_str());
+    return {};
+}
+
+// ---- The file
+
+ChunkFile::~ChunkFile() {
+    if (file_ >= 0) ::close(file_);
+}
+
+// Whoever gives chunks back needs no memory for it: there is room for all of them.
+Status ChunkFile::Take(std::uint32_t& chunk) {
+    const std::lock_guard lock(mutex_);
+    if (file_ < 0) {
+        if (Status status = OpenTemporaryFile(file_); status.Failed()) return status;
+    }
+    if (free_.empty()) {
+        if (free_.capacity() <= count_) free_.reserve(std::max<std::size_t>(16, 2 * std::size_t{count_} + 1));
+        chunk = count_++;
+        return {};
+    }
+    chunk = free_.back();
+    free_.pop_back();
+    return {};
+}
+
+void ChunkFile::GiveBack(std::span<const std::uint32_t> chunks) noexcept {
+    if (chunks.empty()) return;
+    const std::lock_guard lock(mutex_);
+    free_.insert(free_.end(), chunks.begin(), chunks.end());
+    if (free_.size() < count_) return;
+    free_.clear();
+    count_ = 0;
+    (void)!::ftruncate(file_, 0);
+}
+
+Status ChunkFile::Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const {
+    const bool read = All(out.size(), [&](std::size_t done) {
+        return ::pread(file_, out.data() + done, out.size() - done, Place(chunk, at + done));
+    });
+    return read ? Status() : FileFailed("a temporary file cannot be read");
+}
+
+Status ChunkFile::Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const {
+    const bool written = All(in.size(), [&](std::size_t done) {
+        return ::pwrite(file_, in.data() + done, in.size() - done, Place(chunk, at + done));
+    });
+    return written ? Status() : FileFailed("a temporary file cannot be written");
+}
+
+std::size_t ChunkFile::Used() {
+    const std::lock_guard lock(mutex_);
+    return count_ - free_.size();
+}
+
+// ---- The bytes
+
+Status ChunkedBytes::Read(std::uint64_t offset, std::span<std::byte> out, std::size_t& read) const {
+    read = 0;
+    if (offset >= size_) return {};
+    const auto length = static_cast<std::size_t>(std::min<std::uint64_t>(out.size(), size_ - offset));
+    if (chunks_.empty()) {
+        std::memcpy(out.data(), memory_.data() + offset, length);
+        read = length;
+        return {};
+    }
+    while (read < length) {
+        const std::size_t at = (offset + read) % ChunkFile::kChunk;
+        const std::size_t part = std::min(length - read, ChunkFile::kChunk - at);
+        const std::uint32_t chunk = chunks_[static_cast<std::size_t>((offset + read) / ChunkFile::kChunk)];
+        const std::span<std::byte> place = out.subspan(read, part);
+        if (chunk == kGap) std::fill(place.begin(), place.end(), filler_);
+        else if (Status status = file_->Read(chunk, at, place); status.Failed()) return status;
+        read += part;
+    }
+    return {};
+}
+
+Status ChunkedBytes::MoveToFile() {
+    chunks_.reserve(1);
+    std::uint32_t chunk = 0;
+    if (Status status = file_->Take(chunk); status.Failed()) return status;
+    chunks_.push_back(chunk);
+    Status status = file_->Write(chunk, 0, memory_);
+    if (status.Failed()) {
+        file_->GiveBack(chunks_);
+        chunks_.clear();
+        return status;
+    }
+    std::vector<std::byte>().swap(memory_);
+    return status;
+}
+
+// The rest of a chunk, from some byte on.
+Status ChunkedBytes::FillChunk(std::uint32_t chunk, std::size_t from) const {
+    const std::vector<std::byte> fillers(ChunkFile::kChunk - from, filler_);
+    return file_->Write(chunk, from, fillers);
+}
+
+Status ChunkedBytes::Write(std::uint64_t offset, std::span<const std::byte> in) {
+    constexpr std::size_t kChunk = ChunkFile::kChunk;
+    const std::uint64_t end = offset + in.size();
+    if (in.empty()) return {};
+    if (chunks_.empty() && end <= kInMemory) {
+        if (end > memory_.size()) memory_.resize(static_cast<std::size_t>(end), filler_);
+        std::copy(in.begin(), in.end(), memory_.begin() + static_cast<std::ptrdiff_t>(offset));
+        size_ = memory_.size();
+        return {};
+    }
+    if (chunks_.empty()) {
+        if (Status status = MoveToFile(); status.Failed()) return status;
+    }
+    if (offset > size_) {    // what is left of the last chunk belongs to the gap
+        const auto last = static_cast<std::size_t>(size_ / kChunk);
+        chunks_.resize(std::max(chunks_.size(), static_cast<std::size_t>(offset / kChunk)), kGap);
+        if (last < chunks_.size() && chunks_[last] != kGap) {
+            if (Status status = FillChunk(chunks_[last], size_ % kChunk); status.Failed()) return status;
+        }
+    }
+    for (std::size_t done = 0; done < in.size();) {
+        const auto index = static_cast<std::size_t>((offset + done) / kChunk);
+        const std::size_t at = (offset + done) % kChunk;
+        const std::size_t part = std::min(in.size() - done, kChunk - at);
+        if (index == chunks_.size()) chunks_.push_back(kGap);
+        std::uint32_t& chunk = chunks_[index];
+        if (chunk == kGap) {
+            std::uint32_t taken = 0;
+            if (Status status = file_->Take(taken); status.Failed()) return status;
+            chunk = taken;
+            if (part < kChunk) {
+                if (Status status = FillChunk(chunk, 0); status.Failed()) return status;
+            }
+        }
+        if (Status status = file_->Write(chunk, at, in.subspan(done, part)); status.Failed()) return status;
+        done += part;
+    }
+    size_ = std::max(size_, end);
+    return {};
+}
+
+void ChunkedBytes::GiveBack(std::size_t first) noexcept {
+    const auto gaps = std::remove(chunks_.begin() + static_cast<std::ptrdiff_t>(first), chunks_.end(), kGap);
+    chunks_.erase(gaps, chunks_.end());
+    file_->GiveBack(std::span(chunks_).subspan(first));
+    chunks_.resize(first);
+}
+
+Status ChunkedBytes::CopyTo(ChunkedBytes& other) const {
+    std::vector<std::byte> block(static_cast<std::size_t>(std::min<std::uint64_t>(size_, ChunkFile::kChunk)));
+    for (std::size_t read = 0; other.Size() < size_;) {
+        Status status = Read(other.Size(), block, read);
+        if (status.Ok()) status = other.Write(other.Size(), std::span(block).first(read));
+        if (status.Failed()) return status;
+    }
+    return {};
+}
+
+void ChunkedBytes::Trim(std::uint64_t size) noexcept {
+    size_ = std::min(size_, size);
+    if (chunks_.empty()) {
+        memory_.resize(static_cast<std::size_t>(size_));
+        return;
+    }
+    const auto needed = static_cast<std::size_t>((size_ + ChunkFile::kChunk - 1) / ChunkFile::kChunk);
+    const std::size_t kept = std::max<std::size_t>(needed, 1);
+    if (kept >= chunks_.size()) return;
+    GiveBack(kept);
+}
+
+}  // namespace engine

@@ -1,0 +1,72 @@
+// Bytes of any number that can be read and written anywhere: a few in memory, more in chunks of a temporary file that all
+// of a connection share. What is given up is used again, and an empty file takes no room; nor does a gap.
+//
+// Threads: one at a time for what it holds; it may go in any thread.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <mutex>
+#include <span>
+#include <vector>
+
+#include "handles/status.h"
+
+namespace engine {
+
+class ChunkFile {
+public:
+    static constexpr std::size_t kChunk = std::size_t{1} << 16;
+
+    ChunkFile() = default;
+    ~ChunkFile();
+    ChunkFile(const ChunkFile&) = delete;
+    ChunkFile& operator=(const ChunkFile&) = delete;
+
+    Status Take(std::uint32_t& chunk);    // its bytes are anything
+    void GiveBack(std::span<const std::uint32_t> chunks) noexcept;
+    Status Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const;
+    Status Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const;
+    [[nodiscard]] std::size_t Used();
+
+private:
+    std::mutex mutex_;    // of all but the file's bytes
+    int file_ = -1;       // set once, by the first Take
+    std::uint32_t count_ = 0;
+    std::vector<std::uint32_t> free_;
+};
+
+class ChunkedBytes {
+public:
+    // Gaps read as `filler`.
+    ChunkedBytes(std::shared_ptr<ChunkFile> file, std::byte filler) : file_(std::move(file)), filler_(filler) {}
+    ~ChunkedBytes() { GiveBack(0); }
+    ChunkedBytes(const ChunkedBytes&) = delete;
+    ChunkedBytes& operator=(const ChunkedBytes&) = delete;
+
+    [[nodiscard]] std::uint64_t Size() const { return size_; }
+    Status Read(std::uint64_t offset, std::span<std::byte> out, std::size_t& read) const;
+    // A failure in the middle leaves what is behind the old end away.
+    Status Write(std::uint64_t offset, std::span<const std::byte> in);
+    void Trim(std::uint64_t size) noexcept;    // to no more than its size
+    Status CopyTo(ChunkedBytes& other) const;    // which is empty
+
+private:
+    static constexpr std::size_t kInMemory = 4096;
+    static constexpr std::uint32_t kGap = ~std::uint32_t{0};
+    Status MoveToFile();
+    Status FillChunk(std::uint32_t chunk, std::size_t from) const;
+    void GiveBack(std::size_t first) noexcept;
+
+    const std::shared_ptr<ChunkFile> file_;
+    const std::byte filler_;
+    std::vector<std::byte> memory_;         // all of it, while there are no chunks
+    std::vector<std::uint32_t> chunks_;     // behind size_ a chunk is anything
+    std::uint64_t size_ = 0;
+};
+
+// A temporary file without a name, in TMPDIR or /tmp; 1653 or 1115 when there is none to be had.
+Status OpenTemporaryFile(int& file);
+
+}  // namespace engine

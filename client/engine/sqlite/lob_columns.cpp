@@ -1,0 +1,208 @@
+#include "engine/sqlite/lob_columns.h"
+
+#include <algorithm>
+#include <array>
+#include <new>
+#include <optional>
+#include <string>
+
+#include "engine/sqlite/column_types.h"
+#include "engine/sqlite/describe.h"
+#include "engine/sqlite/pieces.h"
+#include "engine/sqlite/table_columns.h"
+
+namespace engine::sqlite {
+namespace {
+
+using PieceList = std::vector<std::string_view>;
+
+bool IsLob(const Column& column) {
+    return column.type == SQLT_CLOB || column.type == SQLT_DBCLOB || column.type == SQLT_BLOB;
+}
+
+bool IsAnyOf(std::string_view piece, std::initializer_list<std::string_view> words) {
+    return std::any_of(words.begin(), words.end(), [&](std::string_view word) { return IsWord(piece, word); });
+}
+
+// The list, the table, and what the list calls the table by.
+struct ListOfTable {
+    Span list;
+    TableName table;
+    std::string_view alias;    // a piece; empty: the table's name
+};
+
+// The first of some words outside of parentheses; the end of the text when there is none.
+std::size_t Find(const PieceList& pieces, std::size_t from, std::initializer_list<std::string_view> words) {
+    int depth = 0;
+    for (std::size_t index = from; index < pieces.size(); ++index) {
+        if (depth == 0 && IsAnyOf(pieces[index], words)) return index;
+        if (pieces[index] == "(") ++depth;
+        if (pieces[index] == ")") --depth;
+    }
+    return pieces.size();
+}
+
+// "select list from table [[as] alias] [where ...] [order by ...] [limit ...]", and nothing that makes rows of others.
+std::optional<ListOfTable> ReadSelect(const PieceList& pieces) {
+    if (pieces.empty() || !IsWord(pieces[0], "select") || (pieces.size() > 1 && IsWord(pieces[1], "distinct"))) return {};
+    const std::size_t first = pieces.size() > 1 && IsWord(pieces[1], "all") ? 2 : 1;
+    const std::size_t from = Find(pieces, first, {"from"});
+    if (from + 1 >= pieces.size() || !IsName(pieces[from + 1])) return {};
+    ListOfTable read;
+    read.list = {first, from};
+    std::size_t at = ReadTableName(pieces, from + 1, read.table);
+    const auto goes_on = [&] { return at < pieces.size() && pieces[at] != ";"; };
+    const auto is_clause = [&] { return IsAnyOf(pieces[at], {"where", "order", "limit"}); };
+    if (goes_on() && IsWord(pieces[at], "as")) ++at;
+    if (goes_on() && !is_clause() && IsName(pieces[at])) read.alias = pieces[at++];
+    if (goes_on() && !is_clause()) return {};
+    if (Find(pieces, at, {"union", "except", "intersect", "group", "having", "window"}) < pieces.size()) return {};
+    const std::size_t order = Find(pieces, at, {"order"});    // "order by 2" means the item
+    const bool by_number = std::any_of(pieces.begin() + static_cast<std::ptrdiff_t>(order), pieces.end(), IsNumber);
+    return by_number ? std::nullopt : std::optional(read);
+}
+
+// "insert into table ... returning list" and its kin.
+std::optional<ListOfTable> ReadReturning(const PieceList& pieces) {
+    if (pieces.size() < 4 || !IsAnyOf(pieces[0], {"insert", "update", "delete", "replace"})) return {};
+    const std::size_t returning = Find(pieces, 0, {"returning"});
+    if (returning == pieces.size()) return {};
+    std::size_t at = 1;
+    if (IsWord(pieces[at], "or")) at += 2;
+    if (IsAnyOf(pieces[at], {"into", "from"})) ++at;
+    ListOfTable read;
+    ReadTableName(pieces, at, read.table);
+    const std::size_t end = pieces.back() == ";" ? pieces.size() - 1 : pieces.size();
+    read.list = {returning + 1, end};
+    return read;
+}
+
+// Whether it is a table whose rows have numbers of their own, and where it lies. Throws bad_alloc.
+bool FindTable(sqlite3* database, TableName& table) {
+    const auto has_numbers = [&](const char* schema) {
+        const char* declared = nullptr;
+        int key = 0;
+        const int code = sqlite3_table_column_metadata(database, schema, table.name.c_str(), "rowid", &declared, nullptr,
+                                                       nullptr, &key, nullptr);
+        if ((code & 0xFF) == SQLITE_NOMEM) throw std::bad_alloc();
+        return code == SQLITE_OK && key != 0 && declared && sqlite3_stricmp(declared, "integer") == 0;
+    };
+    if (!table.schema.empty()) return has_numbers(table.schema.c_str());
+    for (const char* schema : {"temp", "main"}) {
+        if (!has_numbers(schema)) continue;
+        table.schema = schema;
+        return true;
+    }
+    return false;
+}
+
+std::string Quoted(std::string_view name) {
+    std::string quoted = "\"";
+    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
+    return quoted += '"';
+}
+
+class Rewriter {
+public:
+    Rewriter(sqlite3* database, std::string_view sql, const PieceList& pieces, ListOfTable read, LobStore& store)
+        : database_(database), sql_(sql), pieces_(pieces), read_(std::move(read)), store_(store) {}
+
+    // False where the items cannot be told.
+    bool Rewrite(std::size_t columns) {
+        if (!FindTable(database_, read_.table)) return false;
+        std::size_t begin = read_.list.first;
+        while (begin < read_.list.last) {
+            const std::size_t end = std::min(Find(pieces_, begin, {","}), read_.list.last);
+            RewriteItem({begin, end});
+            begin = end + 1;
+        }
+        return index_ == columns;
+    }
+    std::vector<LobItem> items;
+    std::vector<ValueTargets::Edit> edits;
+
+private:
+    std::string Name() const { return read_.alias.empty() ? Quoted(read_.table.name) : std::string(read_.alias); }
+    [[nodiscard]] bool IsTable(std::string_view piece) const {
+        const std::string name = PlainName(piece);
+        const std::string wanted = read_.alias.empty() ? read_.table.name : PlainName(read_.alias);
+        return sqlite3_stricmp(name.c_str(), wanted.c_str()) == 0;
+    }
+
+    void RewriteItem(Span item) {
+        const bool qualified = item.Size() >= 3 && pieces_[item.first + 1] == ".";
+        const std::size_t name = item.first + (qualified ? 2 : 0);
+        if (name + 1 == item.last && pieces_[name] == "*") return RewriteAll(item);
+        const std::size_t index = index_++;
+        const bool behind = name + 1 < item.last;    // an alias, or more of an expression
+        const bool alias = behind && (name + 2 == item.last ? IsName(pieces_[name + 1]) && !IsAnyOf(pieces_[name + 1], {"is", "isnull", "notnull"})
+                                                            : name + 3 == item.last && IsWord(pieces_[name + 1], "as"));
+        if ((behind && !alias) || !IsName(pieces_[name]) || (qualified && !IsTable(pieces_[item.first]))) return;
+        TableColumn column;
+        if (!ReadColumn(database_, read_.table, pieces_[name], column) || !IsLob(column.column)) return;
+        Note(index, column);
+        edits.push_back({Begin(item.first), End(name), Number(column), {}, true});
+    }
+    void RewriteAll(Span item) {
+        std::string list;
+        bool any = false;
+        for (const TableColumn& column : InsertableColumns(database_, read_.table)) {
+            if (!list.empty()) list += ", ";
+            any |= IsLob(column.column);
+            list += IsLob(column.column) ? Number(column) : Name() + '.' + Quoted(column.name);
+            if (IsLob(column.column)) Note(index_, column);
+            ++index_;
+        }
+        if (any) edits.push_back({Begin(item.first), End(item.last - 1), list, {}, true});
+    }
+    void Note(std::size_t index, const TableColumn& column) {
+        const LobKind kind = column.column.type == SQLT_BLOB ? LobKind::bytes : LobKind::characters;
+        items.push_back({index, store_.Column(read_.table.schema, read_.table.name, column.name, kind)});
+    }
+    // What is neither text nor bytes is not read where it lies.
+    [[nodiscard]] std::string Number(const TableColumn& column) const {
+        const std::string value = Name() + '.' + Quoted(column.name);
+        return "case typeof(" + value + ") when 'null' then null when 'text' then " + Name() +
+               ".rowid when 'blob' then " + Name() + ".rowid else cast(" + value + " as text) end";
+    }
+    [[nodiscard]] std::size_t Begin(std::size_t piece) const {
+        return static_cast<std::size_t>(pieces_[piece].data() - sql_.data());
+    }
+    [[nodiscard]] std::size_t End(std::size_t piece) const { return Begin(piece) + pieces_[piece].size(); }
+
+    sqlite3* const database_;
+    const std::string_view sql_;
+    const PieceList& pieces_;
+    ListOfTable read_;
+    LobStore& store_;
+    std::size_t index_ = 0;
+};
+
+// SQLite tells the declared types of a select list, not of what a change returns.
+bool MayHaveLobs(sqlite3_stmt* compiled, bool is_query) {
+    const int count = sqlite3_column_count(compiled);
+    if (!is_query) return count > 0;
+    for (int index = 0; index < count; ++index) {
+        Column column;
+        const char* declared = sqlite3_column_decltype(compiled, index);
+        if (declared && ReadDeclaredType(declared, column) && IsLob(column)) return true;
+    }
+    return false;
+}
+
+}  // namespace
+
+std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, LobStore& store,
+                                  ValueTargets& targets) {
+    const bool is_query = sqlite3_stmt_readonly(compiled) != 0;
+    if (!MayHaveLobs(compiled, is_query)) return {};
+    const PieceList pieces = Split(sql);
+    const std::optional<ListOfTable> read = is_query ? ReadSelect(pieces) : ReadReturning(pieces);
+    if (!read) return {};
+    Rewriter rewriter(database, sql, pieces, *read, store);
+    if (!rewriter.Rewrite(static_cast<std::size_t>(sqlite3_column_count(compiled))) || rewriter.items.empty()) return {};
+    targets.edits.insert(targets.edits.end(), rewriter.edits.begin(), rewriter.edits.end());
+    return std::move(rewriter.items);
+}
+
+}  // namespace engine::sqlite

@@ -1,0 +1,272 @@
+// Large objects as an application uses them: locators of columns and temporary ones, characters, pieces, what is refused.
+#include <algorithm>
+#include <string>
+#include <vector>
+
+#include "support/statement_fixture.h"
+
+namespace {
+
+constexpr ub4 kPast = 0xFFFFFFFF;    // an offset or amount of 4 GB
+
+class Lobs : public StatementTest {
+protected:
+    explicit Lobs(ub4 mode = OCI_DEFAULT) : StatementTest(mode) {}
+    void SetUp() override {
+        StatementTest::SetUp();
+        MustRun("create table l(k integer, c clob, b blob)", "insert into l values(1, 'h\xC3\xA4llo world', x'010203')",
+                "commit");
+        lob = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+        other = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    }
+    static Area Locator(OCILobLocator*& place, ub2 type = SQLT_CLOB) { return {&place, -1, type}; }
+    // The locator of the one row's column; for update, it may be written.
+    void Fetch(OCILobLocator*& place, const char* sql = "select c from l for update", ub2 type = SQLT_CLOB) {
+        ASSERT_EQ(Query(sql, {Locator(place, type)}), 0) << sql;
+    }
+    void Temporary(OCILobLocator* place, ub1 type = OCI_TEMP_CLOB) {
+        ASSERT_EQ(Answer(OCILobCreateTemporary(svc, err, place, 0, 0, type, TRUE, OCI_DURATION_SESSION)), 0);
+    }
+    sb4 Write(OCILobLocator* to, ub4 offset, std::string_view data, ub1 piece = OCI_ONE_PIECE, ub4* amount = nullptr) {
+        ub4 own = 0;
+        return Code(OCILobWrite(svc, err, to, amount ? amount : &own, offset, const_cast<char*>(data.data()), Size(data),
+                                piece, nullptr, nullptr, 0, 0));
+    }
+    // Data, with the amount before it; or the number of the error, or a code without one.
+    std::string Read(OCILobLocator* from, ub4 amount = 1000, ub4 offset = 1, ub4 room = 1000, ub2 set = 0) {
+        std::string data(room, '#');
+        const sb4 code = Code(OCILobRead(svc, err, from, &amount, offset, data.data(), room, nullptr, nullptr, set, 0));
+        const std::string shown = std::to_string(amount) + ":" + data.substr(0, data.find('#'));
+        return code == 0 ? shown : code == OCI_NEED_DATA ? "more " + shown : "!" + std::to_string(code);
+    }
+    sb4 Code(sword code) { return code == OCI_ERROR ? Answer(code) : code; }
+    ub4 LengthOf(OCILobLocator* of) {
+        ub4 length = 4711;
+        EXPECT_EQ(Answer(OCILobGetLength(svc, err, of, &length)), 0);
+        return length;
+    }
+    std::string Stored() { return One("select c from l"); }
+
+    OCILobLocator* lob = nullptr;
+    OCILobLocator* other = nullptr;
+};
+
+TEST_F(Lobs, CharactersAreCounted) {
+    Fetch(lob);
+    EXPECT_EQ(LengthOf(lob), 11u);
+    EXPECT_EQ(Read(lob, 4, 2), "4:\xC3\xA4llo");
+    EXPECT_EQ(Read(lob, 3, 10), "2:ld");                       // the amount shrinks at the end
+    EXPECT_EQ(Read(lob, 3, 12), "!100");
+    EXPECT_EQ(Write(lob, 2, "e"), 0);                          // shorter than what it replaces
+    EXPECT_EQ(Read(lob), "11:hello world");
+    EXPECT_EQ(Write(lob, 5, "\xC3\xB6\xE2\x82\xAC"), 0);       // longer
+    EXPECT_EQ(Read(lob), "11:hell\xC3\xB6\xE2\x82\xACworld");
+    EXPECT_EQ(Write(lob, 14, "!"), 0);                         // behind a gap
+    EXPECT_EQ(Read(lob, 9, 6), "9:\xE2\x82\xACworld  !");
+    EXPECT_EQ(Stored(), "hell\xC3\xB6\xE2\x82\xACworld  !");
+    ub4 erased = 100;
+    EXPECT_EQ(Answer(OCILobErase(svc, err, lob, &erased, 12)), 0);
+    EXPECT_EQ(erased, 3u);
+    EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 6)), 0);
+    EXPECT_EQ(Read(lob, 0), "6:hell\xC3\xB6\xE2\x82\xAC");
+    EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 7)), 22926);
+    MustRun("rollback");
+    EXPECT_EQ(Stored(), "h\xC3\xA4llo world");
+    EXPECT_EQ(Write(lob, 1, "x"), 22990);
+}
+
+TEST_F(Lobs, Utf16IsConvertedBothWays) {
+    Temporary(lob);
+    std::string data("a\0\xE4\0\x3D\xD8\x00\xDE", 8);          // a, a-umlaut, and a character of two units
+    ub4 amount = 0;
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &amount, 1, data.data(), 8, OCI_ONE_PIECE, nullptr, nullptr, 1000, 0)), 0);
+    EXPECT_EQ(amount, 3u);
+    EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF0\x9F\x98\x80");
+    EXPECT_EQ(Read(lob, 2, 2, 6, 1000), "2:" + data.substr(2));
+    EXPECT_EQ(Read(lob, 1, 1, 10, 9999), "!24329");
+    // Torn within the pair; the second half is missing at the end.
+    EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &(amount = 0), 1, data.data(), 5, OCI_FIRST_PIECE, nullptr, nullptr, 1000, 0)),
+              OCI_NEED_DATA);
+    EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, data.data() + 5, 1, OCI_LAST_PIECE, nullptr, nullptr, 1000, 0)),
+              24812);
+}
+
+TEST_F(Lobs, PiecesGoByRepeatedCalls) {
+    Temporary(lob);
+    ub4 amount = 6;
+    EXPECT_EQ(Write(lob, 1, "ab\xC3", OCI_FIRST_PIECE, &amount), OCI_NEED_DATA);
+    ub4 length = 0;
+    EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
+    EXPECT_EQ(Read(lob), "!24804");
+    EXPECT_EQ(Write(other, 1, "x"), 24804);
+    EXPECT_EQ(Write(lob, 1, "\xA4" "cd", OCI_NEXT_PIECE, &amount), OCI_NEED_DATA);    // the offset is not looked at
+    EXPECT_EQ(Write(lob, 99, "e", OCI_LAST_PIECE, &amount), 0);
+    EXPECT_EQ(amount, 6u);
+    EXPECT_EQ(Read(lob, 0, 1, 4), "more 4:ab\xC3\xA4");       // bytes, of a piece
+    EXPECT_EQ(Read(lob, 77, 5, 4), "3:cde");
+    EXPECT_EQ(Read(lob, 3, 1, 2), "more 2:ab");
+    EXPECT_EQ(Read(lob, 3, 1, 2), "2:\xC3\xA4");
+    EXPECT_EQ(Read(lob, 6, 3, 1), "!24809");
+}
+
+sb4 Takes(dvoid* context, const dvoid* data, ub4 length, ub1 piece) {
+    auto& taken = *static_cast<std::string*>(context);
+    taken += std::to_string(piece) + std::string(static_cast<const char*>(data), length);
+    return taken.find('!') == std::string::npos ? OCI_CONTINUE : OCI_ERROR;
+}
+sb4 Gives(dvoid* context, dvoid* room, ub4* length, ub1* piece) {
+    auto& pieces = *static_cast<std::vector<std::string>*>(context);
+    if (pieces.empty()) return OCI_ERROR;
+    *length = static_cast<ub4>(pieces.front().copy(static_cast<char*>(room), *length));
+    pieces.erase(pieces.begin());
+    *piece = pieces.empty() ? OCI_LAST_PIECE : OCI_NEXT_PIECE;
+    return OCI_CONTINUE;
+}
+
+TEST_F(Lobs, PiecesGoThroughCallbacks) {
+    Temporary(lob);
+    std::vector<std::string> pieces{"abc", "", "de\xC3", "\xA4"};
+    char room[8];
+    ub4 amount = 0;
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &amount, 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 0);
+    EXPECT_EQ(amount, 6u);
+    std::string taken;
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 4, &taken, Takes, 0, 0)), 0);
+    EXPECT_EQ(taken, "1abcd3e\xC3\xA4");
+    EXPECT_EQ(amount, 6u);
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 2), 1, nullptr, 0, &(taken = ""), Takes, 0, 0)), 0);
+    EXPECT_EQ(taken, "3ab");
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &amount, 1, room, 4, &(taken = "!"), Takes, 0, 0)), 24802);
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {}), Gives, 0, 0)),
+              24802);
+    pieces = {"abc", "def"};
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 4), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 24810);
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 7), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {"abc", "def"}),
+                                 Gives, 0, 0)), 24811);
+}
+
+TEST_F(Lobs, CopiesStayWithinTheirKind) {
+    OCILobLocator* binary = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    Fetch(lob);
+    Fetch(binary, "select b from l for update", SQLT_BLOB);
+    Temporary(other);
+    ASSERT_EQ(Write(other, 1, "12\xC3\xB6" "4"), 0);
+    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 100, 3, 2)), 0);
+    EXPECT_EQ(Read(lob), "11:h\xC3\xA4" "2\xC3\xB6" "4 world");
+    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, lob, 5, 2, 1)), 0);    // onto itself
+    EXPECT_EQ(Read(lob), "11:hh\xC3\xA4" "2\xC3\xB6" "4world");
+    EXPECT_EQ(Answer(OCILobAppend(svc, err, other, other)), 0);
+    EXPECT_EQ(Read(other), "8:12\xC3\xB6" "412\xC3\xB6" "4");
+    const struct { OCILobLocator *to, *from; ub4 amount, at, source; sb4 answer; } refused[] = {
+        {lob, other, 1, 1, 9, 22994}, {lob, other, 1, 0, 1, 24801}, {lob, other, 1, 1, 0, 24801},
+        {lob, other, 0, 1, 1, 24801}, {lob, binary, 1, 1, 1, 24805}, {binary, lob, 1, 1, 1, 24805}};
+    for (const auto& c : refused)
+        EXPECT_EQ(Answer(OCILobCopy(svc, err, c.to, c.from, c.amount, c.at, c.source)), c.answer) << c.answer;
+    EXPECT_EQ(Read(binary), std::string("3:\1\2\3"));
+}
+
+TEST_F(Lobs, BindsAndReturningTakeLocators) {
+    Temporary(lob);
+    ASSERT_EQ(Write(lob, 1, "by bind"), 0);
+    ASSERT_EQ(Ready("insert into l(k, c) values(2, :1)", {Locator(lob)}), 0);
+    EXPECT_EQ(Execute(), 0);
+    ASSERT_EQ(Ready("insert into l(k, c) values(3, empty_clob()) returning c into :1", {Locator(other)}), 0);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(Write(other, 1, "returned"), 0);
+    EXPECT_EQ(One("select group_concat(c, '|') from l where k > 1"), "by bind|returned");
+    boolean flag = TRUE;
+    EXPECT_EQ(OCILobIsEqual(env, lob, other, &flag), OCI_SUCCESS);
+    EXPECT_EQ(flag, FALSE);
+    Fetch(lob, "select x.c from l x where k = 3");
+    EXPECT_EQ(OCILobIsEqual(env, lob, other, &flag), OCI_SUCCESS);
+    EXPECT_EQ(flag, TRUE);
+    Fetch(lob, "values(cast('of no column' as clob))");
+    EXPECT_EQ(Answer(OCILobIsTemporary(env, err, lob, &flag)), 0);
+    EXPECT_EQ(flag, TRUE);
+    EXPECT_EQ(Answer(OCILobLocatorAssign(svc, err, lob, &other)), 0);
+    EXPECT_EQ(Write(other, 1, "x"), 0);
+    EXPECT_EQ(Read(lob, 2) + Read(other, 2), "2:of2:xf");      // a copy of its own
+}
+
+TEST_F(Lobs, OpeningIsPerTransaction) {
+    Fetch(lob, "select c from l");
+    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 22292);
+    EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 22289);
+    Fetch(lob);
+    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, 7)), 24801);
+    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READONLY)), 0);
+    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 22293);
+    EXPECT_EQ(Write(lob, 1, "x"), 22294);
+    boolean open = FALSE;
+    EXPECT_EQ(Answer(OCILobIsOpen(svc, err, lob, &open)), 0);
+    EXPECT_EQ(open, TRUE);
+    EXPECT_EQ(Prepare("commit"), 0);
+    EXPECT_EQ(ExecuteCode(), OCI_SUCCESS_WITH_INFO);
+    EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 22289);
+}
+
+TEST_F(Lobs, BufferedWritesWait) {
+    Fetch(lob);
+    EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_FREE)), 22276);
+    EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, lob)), 0);
+    Fetch(other);
+    EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, other)), 22277);
+    EXPECT_EQ(Write(lob, 1, "H"), 0);
+    EXPECT_EQ(Write(lob, 2, "A"), 0);
+    EXPECT_EQ(Read(other, 2), "2:h\xC3\xA4");
+    EXPECT_EQ(Read(lob, 3), "3:HAl");
+    ub4 amount = 0;
+    EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &amount)), 22279);
+    EXPECT_EQ(Read(lob, 10, 1, 4), "!24808");
+    EXPECT_EQ(Write(lob, 20, "x"), 22282);
+    EXPECT_EQ(Write(lob, 1, std::string(600000, 'x')), 22280);
+    EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, 9)), 24801);
+    EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_FREE)), 0);
+    EXPECT_EQ(Answer(OCILobDisableBuffering(svc, err, lob)), 0);
+    EXPECT_EQ(Stored(), "HAllo world");
+}
+
+TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
+    ub4 length = 0;
+    boolean flag = TRUE;
+    char room[10];
+    EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 22275);
+    EXPECT_EQ(Answer(OCILobLocatorIsInit(env, err, lob, &flag)), 0);
+    EXPECT_EQ(flag, FALSE);
+    EXPECT_EQ(OCILobGetLength(svc, err, nullptr, &length), OCI_ERROR);
+    EXPECT_EQ(OCILobGetLength(svc, err, reinterpret_cast<OCILobLocator*>(room), &length), OCI_INVALID_HANDLE);
+    EXPECT_EQ(Answer(OCILobFreeTemporary(svc, err, lob)), 22275);
+    Fetch(lob);
+    EXPECT_EQ(Answer(OCILobFreeTemporary(svc, err, lob)), 22275);
+    EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
+    EXPECT_EQ(Read(lob, 4, 0) + Read(lob, 4, kPast) + Read(lob, 4, 1, 0), "!24801!100!24803");
+    EXPECT_EQ(Write(lob, 0, "x"), 24801);
+    EXPECT_EQ(Write(lob, kPast, "x"), 22925);
+    EXPECT_EQ(Write(lob, 1, "x", OCI_NEXT_PIECE), 24801);
+    EXPECT_EQ(Write(lob, 1, "x", OCI_ONE_PIECE, &(length = 2)), 22921);
+    EXPECT_EQ(Read(lob, kPast), "11:h\xC3\xA4llo world");
+    oraub8 far = ~oraub8{0};
+    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &(far = 1), ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)), 24281);
+    OCISvcCtx* elsewhere = nullptr;
+    ASSERT_EQ(Logon(&elsewhere), OCI_SUCCESS);
+    EXPECT_EQ(Answer(OCILobGetLength(elsewhere, err, lob, &length)), 22927);
+    OCILogoff(elsewhere, err);
+    // A read in pieces holds the session's other large objects up, until its locator is gone.
+    EXPECT_EQ(Read(lob, 11, 1, 4), "more 4:h\xC3\xA4l");
+    EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
+    EXPECT_EQ(OCIDescriptorFree(lob, OCI_DTYPE_LOB), OCI_SUCCESS);
+    Temporary(other);
+}
+
+TEST_F(Lobs, SessionMayEndBeforeItsLocators) {
+    Fetch(lob);
+    Temporary(other);
+    OCILogoff(svc, err);
+    boolean flag = FALSE;
+    EXPECT_EQ(Answer(OCILobIsTemporary(env, err, other, &flag)), 0);
+    ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
+    EXPECT_EQ(Read(lob) + Read(other), "!22927!22927");
+    EXPECT_EQ(OCIDescriptorFree(lob, OCI_DTYPE_LOB), OCI_SUCCESS);
+}
+
+}  // namespace
