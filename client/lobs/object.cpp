@@ -56,6 +56,11 @@ Status LargeObject::Seek(std::uint64_t units, std::uint64_t& bytes, std::uint64_
     Refresh();
     if (state_->end && state_->end->units <= units) state_->last = *state_->end;
     LocatorState::Place place = state_->last.units <= units ? state_->last : LocatorState::Place();
+    if (place.units == units) {
+        bytes = place.bytes;
+        reached = units;
+        return {};
+    }
     std::string block(kBlock, '\0');
     for (;;) {
         std::size_t read = 0;
@@ -79,6 +84,11 @@ Status LargeObject::Seek(std::uint64_t units, std::uint64_t& bytes, std::uint64_
     bytes = place.bytes;
     reached = place.units;
     return {};
+}
+
+void LargeObject::Remember(std::uint64_t units, std::uint64_t bytes) {
+    Refresh();
+    state_->last = {units, bytes};
 }
 
 Status LargeObject::Read(std::uint64_t bytes, std::size_t most_bytes, std::uint64_t most_units, std::string& text,

@@ -64,6 +64,8 @@ public:
     // Whole units from a byte on, up to most bytes and units; `text` is overwritten. Shorter at the end alone.
     Status Read(std::uint64_t bytes, std::size_t most_bytes, std::uint64_t most_units, std::string& text,
                 std::uint64_t& units);
+    // That a unit begins there, for who has read up to it.
+    void Remember(std::uint64_t units, std::uint64_t bytes);
     // Puts `units` units in the place of as many, and on behind the end; a gap is filled with zero bytes or blanks.
     Status Replace(std::uint64_t at, std::string_view data, std::uint64_t units);
     Status Trim(std::uint64_t units);                           // 22926

@@ -131,6 +131,7 @@ Status ReadPiece(Stream& stream, char* out, std::uint64_t room, Transferred& pie
         std::uint64_t length = 0;
         if (status = stream.object.Lob().Length(length); status.Failed()) return status;
         ends = stream.byte >= length || Left(stream) == 0;
+        stream.object.Remember(stream.at + stream.units, stream.byte);
         if (ends || (block.bytes == 0 && piece.bytes > 0)) return status;
         if (block.bytes == 0) return Error(errors::kAmountTooLarge);
         if (piece.bytes == room) return status;
