@@ -1,0 +1,65 @@
+// The version-7 calls. Their gate is legacy/call.h: areas take the place of handles.
+#include "legacy/cursors.h"
+#include "legacy/logins.h"
+#include "oci_legacy.h"
+
+sword olog(Lda_Def* lda, ub1* hda, text* user, sword userLen, text* pw, sword pwLen, text* db, sword dbLen, ub4 mode) {
+    return legacy::LogOn(lda, hda != nullptr, {user, userLen}, {pw, pwLen}, {db, dbLen}, mode);
+}
+
+sword ologof(Lda_Def* lda) { return legacy::LogOff(lda); }
+sword ocom(Lda_Def* lda) { return legacy::Commit(lda); }
+sword orol(Lda_Def* lda) { return legacy::Rollback(lda); }
+sword ocon(Lda_Def* lda) { return legacy::CommitEach(lda, true); }
+sword ocof(Lda_Def* lda) { return legacy::CommitEach(lda, false); }
+sword obreak(Lda_Def* lda) { return legacy::Break(lda); }
+sword onbset(Lda_Def* lda) { return legacy::SetNonBlocking(lda, true); }
+sword onbclr(Lda_Def* lda) { return legacy::SetNonBlocking(lda, false); }
+sword onbtst(Lda_Def* lda) { return legacy::TestNonBlocking(lda); }
+
+sword oopen(Cda_Def* cursor, Lda_Def* lda, text*, sword, sword, text*, sword) {
+    return legacy::OpenCursor(cursor, lda);
+}
+
+sword oclose(Cda_Def* cursor) { return legacy::CloseCursor(cursor); }
+
+sword oparse(Cda_Def* cursor, text* sql, sb4 sqlLen, sword deferred, ub4 language) {
+    return legacy::Parse(cursor, sql, sqlLen, deferred != 0, language);
+}
+
+sword oexec(Cda_Def* cursor) { return legacy::Execute(cursor); }
+sword oexn(Cda_Def* cursor, sword iters, sword rowoff) { return legacy::ExecuteRows(cursor, iters, rowoff); }
+sword ofetch(Cda_Def* cursor) { return legacy::Fetch(cursor, 1); }
+sword ofen(Cda_Def* cursor, sword rows) { return legacy::Fetch(cursor, rows); }
+sword ocan(Cda_Def* cursor) { return legacy::Cancel(cursor); }
+
+sword odescr(Cda_Def* cursor, sword pos, sb4* dbSize, sb2* dbType, sb1* name, sb4* nameLen, sb4* dispSize, sb2* prec,
+             sb2* scale, sb2* nullOk) {
+    return legacy::Describe(cursor, pos, {dbSize, dbType, name, nameLen, dispSize, prec, scale, nullOk});
+}
+
+// Formats are for display types, which there are none of.
+sword odefin(Cda_Def* cursor, sword pos, ub1* buf, sword bufLen, sword type, sword scale, sb2* ind, text*, sword, sword,
+             ub2* rlen, ub2* rcode) {
+    return legacy::Define(cursor, legacy::Function::odefin, pos, {buf, bufLen, type, scale, ind, rlen, rcode});
+}
+
+sword obndrv(Cda_Def* cursor, text* name, sword nameLen, ub1* value, sword valueLen, sword type, sword scale, sb2* ind,
+             text*, sword, sword) {
+    return legacy::BindName(cursor, legacy::Function::obndrv, {name, nameLen}, {value, valueLen, type, scale, ind}, {});
+}
+
+sword obndrn(Cda_Def* cursor, sword number, ub1* value, sword valueLen, sword type, sword scale, sb2* ind, text*, sword,
+             sword) {
+    return legacy::BindNumber(cursor, number, {value, valueLen, type, scale, ind});
+}
+
+sword obndra(Cda_Def* cursor, text* name, sword nameLen, ub1* value, sword valueLen, sword type, sword scale, sb2* ind,
+             ub2* alen, ub2* rcode, ub4 maxElems, ub4* curElems, text*, sword, sword) {
+    return legacy::BindName(cursor, legacy::Function::obndra, {name, nameLen},
+                            {value, valueLen, type, scale, ind, alen, rcode}, {maxElems, curElems});
+}
+
+sword oermsg(sb2 code, text* buf) { return legacy::Message(nullptr, code, buf, 512); }
+sword oerhms(Lda_Def* lda, sb2 code, text* buf, sword bufLen) { return legacy::Message(lda, code, buf, bufLen); }
+sword opinit(ub4 mode) { return legacy::SetThreads(mode); }

@@ -1,0 +1,100 @@
+// The register of the areas that are known, and the handles behind them.
+#include "legacy/areas.h"
+
+#include <unordered_map>
+
+namespace legacy {
+namespace {
+
+// Never destroyed: calls may come while the process ends.
+struct Register {
+    std::mutex mutex;
+    std::unordered_map<const void*, std::shared_ptr<Login>> logins;
+    std::unordered_map<const void*, std::shared_ptr<Cursor>> cursors;
+};
+
+Register& Known() {
+    static auto* const known = new Register;
+    return *known;
+}
+
+template <class Value>
+std::shared_ptr<Value> Find(const std::unordered_map<const void*, std::shared_ptr<Value>>& areas, const void* area) {
+    const std::lock_guard lock(Known().mutex);
+    const auto found = areas.find(area);
+    return found == areas.end() ? nullptr : found->second;
+}
+
+}  // namespace
+
+Login::~Login() {
+    if (environment) (void)OCIHandleFree(environment, OCI_HTYPE_ENV);
+}
+
+bool Login::Open() {
+    dvoid* handle = nullptr;
+    if (OCIEnvCreate(&environment, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr) != OCI_SUCCESS) {
+        return false;
+    }
+    if (OCIHandleAlloc(environment, &handle, OCI_HTYPE_ERROR, 0, nullptr) != OCI_SUCCESS) return false;
+    error = static_cast<OCIError*>(handle);
+    return true;
+}
+
+Cursor::~Cursor() {
+    if (statement) (void)OCIHandleFree(statement, OCI_HTYPE_STMT);
+    if (error) (void)OCIHandleFree(error, OCI_HTYPE_ERROR);
+}
+
+bool Cursor::Open() {
+    dvoid* handle = nullptr;
+    if (OCIHandleAlloc(login->environment, &handle, OCI_HTYPE_ERROR, 0, nullptr) != OCI_SUCCESS) return false;
+    error = static_cast<OCIError*>(handle);
+    if (OCIHandleAlloc(login->environment, &handle, OCI_HTYPE_STMT, 0, nullptr) != OCI_SUCCESS) return false;
+    statement = static_cast<OCIStmt*>(handle);
+    return true;
+}
+
+std::shared_ptr<Login> FindLogin(const void* area) { return Find(Known().logins, area); }
+std::shared_ptr<Cursor> FindCursor(const void* area) { return Find(Known().cursors, area); }
+
+void Enter(const void* area, std::shared_ptr<Login> login) {
+    const std::lock_guard lock(Known().mutex);
+    Known().logins[area] = std::move(login);
+}
+
+void Enter(const void* area, std::shared_ptr<Cursor> cursor) {
+    const std::lock_guard lock(Known().mutex);
+    Known().cursors[area] = std::move(cursor);
+}
+
+std::shared_ptr<Cursor> ForgetCursor(const void* area) {
+    const std::lock_guard lock(Known().mutex);
+    const auto found = Known().cursors.find(area);
+    if (found == Known().cursors.end()) return nullptr;
+    std::shared_ptr<Cursor> cursor = std::move(found->second);
+    Known().cursors.erase(found);
+    return cursor;
+}
+
+std::shared_ptr<Login> ForgetLogin(const void* area, std::vector<std::shared_ptr<Cursor>>& cursors) {
+    const std::lock_guard lock(Known().mutex);
+    const auto found = Known().logins.find(area);
+    if (found == Known().logins.end()) return nullptr;
+    std::size_t count = 0;
+    for (const auto& [unused, cursor] : Known().cursors) count += cursor->login == found->second;
+    cursors.reserve(count);    // nothing fails below
+    std::shared_ptr<Login> login = std::move(found->second);
+    Known().logins.erase(found);
+    for (auto at = Known().cursors.begin(); at != Known().cursors.end();) {
+        if (at->second->login == login) {
+            cursors.push_back(std::move(at->second));
+            at = Known().cursors.erase(at);
+        } else {
+            ++at;
+        }
+    }
+    return login;
+}
+
+}  // namespace legacy

@@ -1,0 +1,250 @@
+// The calls on cursor areas, on the statement that the cursor owns.
+#include "legacy/cursors.h"
+
+#include <cstring>
+#include <string_view>
+#include <utility>
+
+#include "sql/statement_text.h"
+
+namespace legacy {
+namespace {
+
+template <class Value>
+Value Attribute(const Cursor& cursor, ub4 attribute) {
+    Value value = 0;
+    (void)OCIAttrGet(cursor.statement, OCI_HTYPE_STMT, &value, nullptr, attribute, cursor.error);
+    return value;
+}
+
+int RunStatement(Cursor& cursor, ub4 iterations, ub4 first, ub4 mode) {
+    return Outcome(OCIStmtExecute(cursor.login->service, cursor.statement, cursor.error, iterations, first, nullptr,
+                                  nullptr, mode),
+                   cursor);
+}
+
+void NoteOffset(const Cursor& cursor, Cda_Def& area) { area.peo = Attribute<ub2>(cursor, OCI_ATTR_PARSE_ERROR_OFFSET); }
+
+// Whether the next call has to give or take a piece: then the direction is told from what is wanted.
+int AskForPiece(Cursor& cursor, int result, Cursor::Waits by) {
+    cursor.waits = Cursor::Waits::no;
+    if (result != errors::kWantsPiece) return result;
+    ub1 direction = OCI_PARAM_IN;
+    (void)OCIStmtGetPieceInfo(cursor.statement, cursor.error, nullptr, nullptr, &direction, nullptr, nullptr, nullptr);
+    cursor.waits = by;
+    return direction == OCI_PARAM_OUT ? errors::kWantsBuffer : errors::kWantsPiece;
+}
+
+void EndResult(Cursor& cursor) {
+    if (cursor.has_result) (void)OCIStmtFetch2(cursor.statement, cursor.error, 0, OCI_FETCH_NEXT, 0, OCI_DEFAULT);
+    cursor.has_result = false;
+    cursor.waits = Cursor::Waits::no;
+}
+
+// ---- Text
+
+int Compile(Cursor& cursor) {
+    if (cursor.compiled) return 0;
+    const int result = RunStatement(cursor, 0, 0, cursor.is_query ? OCI_DESCRIBE_ONLY : OCI_PARSE_ONLY);
+    cursor.compiled = result == 0;
+    return result;
+}
+
+ub4 RunMode(const Cursor& cursor) { return cursor.login->commits ? OCI_COMMIT_ON_SUCCESS : OCI_DEFAULT; }
+
+int ParseNow(Cursor& cursor, bool is_definition) {
+    if (!is_definition) return Compile(cursor);
+    const int result = RunStatement(cursor, 1, 0, RunMode(cursor));
+    cursor.definition_ran = cursor.compiled = result == 0;
+    return result;
+}
+
+int ParseText(Cursor& cursor, Cda_Def& area, std::string_view sql, bool deferred) {
+    EndResult(cursor);
+    cursor.parsed = cursor.compiled = cursor.definition_ran = false;
+    cursor.highest_define = 0;
+    cursor.rows = cursor.rows_before = 0;
+    cursor.pieces.clear();
+    area.ft = 0;
+    area.rpc = 0;
+    area.peo = 0;
+    const auto* const begin = reinterpret_cast<const OraText*>(sql.data());
+    const int failed = Outcome(OCIStmtPrepare(cursor.statement, cursor.error, begin, static_cast<ub4>(sql.size()),
+                                              OCI_NTV_SYNTAX, OCI_DEFAULT),
+                               cursor);
+    if (failed != 0) return failed;
+    const sql::StatementText scanned = sql::Scan(sql);
+    const bool is_definition =
+        !scanned.is_block && !scanned.steps.empty() && scanned.steps[0].run == sql::Run::definition;
+    area.ft = Attribute<ub2>(cursor, OCI_ATTR_SQLFNCODE);
+    cursor.is_query = scanned.type == sql::StatementType::select;
+    const int result = deferred ? 0 : ParseNow(cursor, is_definition);
+    cursor.parsed = result == 0;
+    if (result != 0) NoteOffset(cursor, area);
+    return result;
+}
+
+// ---- Running
+
+// A query opens; a column that is defined must be there.
+int Opened(Cursor& cursor) {
+    cursor.has_result = true;
+    if (cursor.highest_define <= static_cast<sword>(Attribute<ub4>(cursor, OCI_ATTR_PARAM_COUNT))) return 0;
+    EndResult(cursor);
+    return errors::kNoSuchColumn;
+}
+
+int Run(Cursor& cursor, Cda_Def& area, ub4 iterations, ub4 first) {
+    cursor.rows = cursor.rows_before = 0;
+    area.rpc = 0;
+    if (std::exchange(cursor.definition_ran, false)) return 0;
+    cursor.has_result = false;
+    const bool goes_on = cursor.waits == Cursor::Waits::execute;
+    if (cursor.is_query) iterations = first = 0;
+    int result = RunStatement(cursor, iterations, first, RunMode(cursor));
+    result = AskForPiece(cursor, result, Cursor::Waits::execute);
+    if (cursor.waits != Cursor::Waits::no) return result;
+    if (result == 0) cursor.compiled = true;
+    else if (!goes_on) NoteOffset(cursor, area);
+    if (!cursor.is_query) area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROW_COUNT);
+    return result == 0 && cursor.is_query ? Opened(cursor) : result;
+}
+
+int FetchRows(Cursor& cursor, Cda_Def& area, sword rows) {
+    area.rpc = cursor.rows;
+    if (rows < 1) return errors::kNoIterations;
+    if (cursor.waits == Cursor::Waits::execute) return errors::kOperationActive;
+    if (!cursor.has_result) return errors::kFetchOutOfSequence;
+    if (cursor.waits == Cursor::Waits::no) cursor.rows_before = cursor.rows;
+    int result = Outcome(OCIStmtFetch2(cursor.statement, cursor.error, static_cast<ub4>(rows), OCI_FETCH_NEXT, 0,
+                                       OCI_DEFAULT),
+                         cursor);
+    cursor.rows = cursor.rows_before + Attribute<ub4>(cursor, OCI_ATTR_ROWS_FETCHED);
+    area.rpc = cursor.rows;
+    result = AskForPiece(cursor, result, Cursor::Waits::fetch);
+    if (result == errors::kNoRows || result == errors::kFetchOutOfSequence) cursor.has_result = false;
+    return result;
+}
+
+// ---- Describing
+
+template <class Value>
+Value ColumnAttribute(dvoid* column, const Cursor& cursor, ub4 attribute) {
+    Value value = 0;
+    (void)OCIAttrGet(column, OCI_DTYPE_PARAM, &value, nullptr, attribute, cursor.error);
+    return value;
+}
+
+template <class To, class From>
+void Put(To* place, From value) {
+    if (place) *place = static_cast<To>(value);
+}
+
+// The name is cut to the room announced, and not terminated.
+void PutName(dvoid* column, const Cursor& cursor, const ColumnPlaces& places) {
+    OraText* name = nullptr;
+    ub4 length = 0;
+    if (!places.name_length) return;
+    if (OCIAttrGet(column, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, cursor.error) != OCI_SUCCESS) length = 0;
+    const sb4 room = std::max(*places.name_length, sb4{0});
+    if (places.name) length = std::min(length, static_cast<ub4>(room));
+    if (places.name && length > 0) std::memcpy(places.name, name, length);
+    *places.name_length = static_cast<sb4>(length);
+}
+
+int DescribeColumn(Cursor& cursor, Cda_Def& area, sword position, const ColumnPlaces& places) {
+    if (!cursor.has_result) {
+        if (const int failed = Compile(cursor)) {
+            NoteOffset(cursor, area);
+            return failed;
+        }
+    }
+    dvoid* column = nullptr;
+    if (!cursor.is_query || position < 1 ||
+        OCIParamGet(cursor.statement, OCI_HTYPE_STMT, cursor.error, &column, static_cast<ub4>(position)) != OCI_SUCCESS) {
+        return errors::kNoSuchColumn;
+    }
+    Put(places.size, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DATA_SIZE));
+    Put(places.type, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DATA_TYPE));
+    Put(places.display_size, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DISP_SIZE));
+    Put(places.precision, ColumnAttribute<sb2>(column, cursor, OCI_ATTR_PRECISION));
+    Put(places.scale, ColumnAttribute<sb1>(column, cursor, OCI_ATTR_SCALE));
+    Put(places.null_ok, ColumnAttribute<ub1>(column, cursor, OCI_ATTR_IS_NULL) != 0 ? 1 : 0);
+    PutName(column, cursor, places);
+    (void)OCIDescriptorFree(column, OCI_DTYPE_PARAM);
+    return 0;
+}
+
+// What a cursor waits for goes with it; the register has let it go.
+void End(const std::shared_ptr<Cursor>& cursor) {
+    cursor->ended = true;
+    EndResult(*cursor);
+}
+
+}  // namespace
+
+sword OpenCursor(Cda_Def* area, Lda_Def* login_area) {
+    const std::shared_ptr<Login> login = FindLogin(login_area);
+    if (!area || FindLogin(area)) return errors::kInvalidCursor;
+    if (FindCursor(area)) (void)CloseCursor(area);
+    std::memset(area, 0, sizeof *area);
+    return SetResult(*area, Function::oopen, Guarded([&]() -> int {
+        if (!login) return errors::kInvalidCursor;
+        const std::lock_guard turn(login->turn);
+        if (login->ended) return errors::kInvalidCursor;
+        const auto cursor = std::make_shared<Cursor>(login);
+        if (!cursor->Open()) return errors::kOutOfMemory;
+        Enter(area, cursor);
+        return 0;
+    }));
+}
+
+sword CloseCursor(Cda_Def* area) {
+    return OnCursor(area, Function::oclose, [area](Cursor&) {
+        End(ForgetCursor(area));
+        return 0;
+    });
+}
+
+sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 language) {
+    return OnCursor(area, Function::oparse, [&](Cursor& cursor) -> int {
+        if (!sql) return errors::kParameterMissing;
+        if (length < -1 || language > 2) return errors::kParameterOutOfRange;
+        const auto* const begin = reinterpret_cast<const char*>(sql);
+        const auto size = length < 0 ? std::strlen(begin) : static_cast<std::size_t>(length);
+        return ParseText(cursor, *area, {begin, size}, deferred);
+    });
+}
+
+sword Execute(Cda_Def* area) {
+    return OnStatement(area, Function::oexec, [&](Cursor& cursor) { return Run(cursor, *area, 1, 0); });
+}
+
+sword ExecuteRows(Cda_Def* area, sword iterations, sword first) {
+    return OnStatement(area, Function::oexec, [&](Cursor& cursor) -> int {
+        const bool some = first >= 0 && iterations > first;
+        if (!some && !cursor.is_query) {
+            area->rpc = 0;
+            return errors::kNoIterations;
+        }
+        return Run(cursor, *area, some ? static_cast<ub4>(iterations) : 1, some ? static_cast<ub4>(first) : 0);
+    });
+}
+
+sword Fetch(Cda_Def* area, sword rows) {
+    return OnStatement(area, Function::ofetch, [&](Cursor& cursor) { return FetchRows(cursor, *area, rows); });
+}
+
+sword Cancel(Cda_Def* area) {
+    return OnCursor(area, Function::ocan, [](Cursor& cursor) {
+        EndResult(cursor);
+        return 0;
+    });
+}
+
+sword Describe(Cda_Def* area, sword position, const ColumnPlaces& places) {
+    return OnStatement(area, Function::odescr,
+                       [&](Cursor& cursor) { return DescribeColumn(cursor, *area, position, places); });
+}
+
+}  // namespace legacy

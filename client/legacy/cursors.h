@@ -1,0 +1,50 @@
+// The calls on cursor areas: text, execute, fetch, describe (cursors.cpp), places of values (places.cpp).
+#pragma once
+
+#include "legacy/call.h"
+
+namespace legacy {
+
+sword OpenCursor(Cda_Def* area, Lda_Def* login);
+sword CloseCursor(Cda_Def* area);
+sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 language);
+sword Execute(Cda_Def* area);
+sword ExecuteRows(Cda_Def* area, sword iterations, sword first);
+sword Fetch(Cda_Def* area, sword rows);
+sword Cancel(Cda_Def* area);
+
+struct ColumnPlaces {
+    sb4* size;
+    sb2* type;
+    sb1* name;
+    sb4* name_length;
+    sb4* display_size;
+    sb2* precision;
+    sb2* scale;
+    sb2* null_ok;
+};
+sword Describe(Cda_Def* area, sword position, const ColumnPlaces& places);
+
+// Where an application keeps values: what the bind and define calls share.
+struct Place {
+    dvoid* value;
+    sb4 length;
+    sword type;
+    sword scale;
+    sb2* indicator;
+    ub2* lengths = nullptr;
+    ub2* codes = nullptr;
+};
+struct Name {
+    const text* begin;
+    sb4 length;
+};
+struct Table {
+    ub4 most = 0;
+    ub4* current = nullptr;
+};
+sword Define(Cda_Def* area, Function function, sword position, Place place);
+sword BindName(Cda_Def* area, Function function, Name name, Place place, Table table);
+sword BindNumber(Cda_Def* area, sword number, Place place);
+
+}  // namespace legacy
