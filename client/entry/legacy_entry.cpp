@@ -1,7 +1,12 @@
 // The version-7 calls. Their gate is legacy/call.h: areas take the place of handles.
+#include <string_view>
+
+#include "handles/gate.h"
 #include "legacy/cursors.h"
 #include "legacy/logins.h"
 #include "oci_legacy.h"
+#include "sessions/service_context.h"
+#include "xa/resource_manager.h"
 
 sword olog(Lda_Def* lda, ub1* hda, text* user, sword userLen, text* pw, sword pwLen, text* db, sword dbLen, ub4 mode) {
     return legacy::LogOn(lda, hda != nullptr, {user, userLen}, {pw, pwLen}, {db, dbLen}, mode);
@@ -63,3 +68,51 @@ sword obndra(Cda_Def* cursor, text* name, sword nameLen, ub1* value, sword value
 sword oermsg(sb2 code, text* buf) { return legacy::Message(nullptr, code, buf, 512); }
 sword oerhms(Lda_Def* lda, sb2 code, text* buf, sword bufLen) { return legacy::Message(lda, code, buf, bufLen); }
 sword opinit(ub4 mode) { return legacy::SetThreads(mode); }
+
+sword oexfet(Cda_Def* cursor, ub4 rows, sword cancel, sword exact) {
+    return legacy::ExecuteAndFetch(cursor, rows, cancel != 0, exact != 0);
+}
+
+sword odefinps(Cda_Def* cursor, ub1 opcode, sword pos, ub1* bufOrCtx, sb4 bufLen, sword type, sword scale, sb2* ind,
+               text*, sb4, sword, ub2* rlen, ub2* rcode, sb4 valueSkip, sb4 indSkip, sb4 lenSkip, sb4 rcodeSkip) {
+    const legacy::Steps steps{opcode, valueSkip, indSkip, lenSkip, rcodeSkip};
+    return legacy::Define(cursor, legacy::Function::odefinps, pos, {bufOrCtx, bufLen, type, scale, ind, rlen, rcode},
+                          &steps);
+}
+
+sword obindps(Cda_Def* cursor, ub1 opcode, text* name, sb4 nameLen, ub1* valueOrCtx, sb4 valueLen, sword type,
+              sword scale, sb2* ind, ub2* alen, ub2* rcode, sb4 valueSkip, sb4 indSkip, sb4 lenSkip, sb4 rcodeSkip,
+              ub4 maxElems, ub4* curElems, text*, sb4, sword) {
+    const legacy::Steps steps{opcode, valueSkip, indSkip, lenSkip, rcodeSkip};
+    return legacy::BindName(cursor, legacy::Function::obindps, {name, nameLen},
+                            {valueOrCtx, valueLen, type, scale, ind, alen, rcode}, {maxElems, curElems}, &steps);
+}
+
+sword ogetpi(Cda_Def* cursor, ub1* piece, dvoid** ctx, ub4* iter, ub4* index) {
+    return legacy::GetPiece(cursor, piece, ctx, iter, index);
+}
+
+sword osetpi(Cda_Def* cursor, ub1 piece, dvoid* buf, ub4* len) { return legacy::SetPiece(cursor, piece, buf, len); }
+
+sword odessp(Lda_Def* lda, text* object, size_t, ub1*, size_t, ub1*, size_t, ub2*, ub2*, ub2*, text**, ub2*, ub2*, ub1*,
+             ub1*, ub4*, sb2*, sb2*, ub1*, ub4*, ub4* arraySize) {
+    return legacy::DescribeProcedure(lda, object, arraySize);
+}
+
+void sqllda(Lda_Def* lda) { sqlld2(lda, nullptr, nullptr); }
+
+// The connection of a name; without a name the first.
+void sqlld2(Lda_Def* lda, text* dbName, sb4* dbNameLen) {
+    const CallInFlight call;
+    OCISvcCtx* service = nullptr;
+    (void)legacy::Guarded([&] {
+        std::string_view name;
+        const auto* const begin = reinterpret_cast<const char*>(dbName);
+        if (dbName && dbNameLen && *dbNameLen < -1) return 0;
+        if (dbName && dbNameLen && *dbNameLen >= 0) name = {begin, static_cast<std::size_t>(*dbNameLen)};
+        else if (dbName) name = begin;
+        if (const xa::ManagerPointer manager = xa::FindManager(name)) service = AsHandle<OCISvcCtx>(manager->GetService());
+        return 0;
+    });
+    legacy::Borrow(lda, service);
+}

@@ -34,6 +34,7 @@ public:
     OCIEnv* environment = nullptr;
     OCIError* error = nullptr;
     OCISvcCtx* service = nullptr;
+    bool borrowed = false;    // the service context is a connection's of the XA switch
     bool commits = false;    // each execute that succeeds
     int last_error = 0;      // with the engine's words, for oerhms
     std::string last_message;
@@ -44,8 +45,8 @@ struct PieceArea {
     dvoid* context;
     sb2* indicator;
     ub2* code;
-    sb4 indicator_skip;
-    sb4 code_skip;
+    sb4 indicator_skip = sizeof(sb2);
+    sb4 code_skip = sizeof(ub2);
 };
 
 class Cursor {
@@ -66,6 +67,7 @@ public:
     bool parsed = false;
     bool is_query = false;
     bool compiled = false;
+    bool described = false;    // its columns are at hand without a result
     bool definition_ran = false;    // by oparse, so that the first execute has nothing to do
     bool has_result = false;
     bool truncated = false;         // by the call that runs

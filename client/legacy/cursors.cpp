@@ -2,10 +2,13 @@
 #include "legacy/cursors.h"
 
 #include <cstring>
+#include <limits>
 #include <string_view>
 #include <utility>
 
+#include "handles/gate.h"
 #include "sql/statement_text.h"
+#include "statements/statement.h"
 
 namespace legacy {
 namespace {
@@ -35,20 +38,20 @@ int AskForPiece(Cursor& cursor, int result, Cursor::Waits by) {
     return direction == OCI_PARAM_OUT ? errors::kWantsBuffer : errors::kWantsPiece;
 }
 
+// The result is gone, and with it an operation that waits for a piece.
 void EndResult(Cursor& cursor) {
-    if (cursor.has_result) (void)OCIStmtFetch2(cursor.statement, cursor.error, 0, OCI_FETCH_NEXT, 0, OCI_DEFAULT);
-    cursor.has_result = false;
+    if (cursor.has_result || cursor.waits != Cursor::Waits::no) {
+        const CallInFlight call;
+        if (auto* const statement = Live<Statement>(cursor.statement)) {
+            const SerialLock lock(*statement);
+            statement->Rest();
+        }
+    }
+    cursor.has_result = cursor.described = false;
     cursor.waits = Cursor::Waits::no;
 }
 
 // ---- Text
-
-int Compile(Cursor& cursor) {
-    if (cursor.compiled) return 0;
-    const int result = RunStatement(cursor, 0, 0, cursor.is_query ? OCI_DESCRIBE_ONLY : OCI_PARSE_ONLY);
-    cursor.compiled = result == 0;
-    return result;
-}
 
 ub4 RunMode(const Cursor& cursor) { return cursor.login->commits ? OCI_COMMIT_ON_SUCCESS : OCI_DEFAULT; }
 
@@ -61,7 +64,7 @@ int ParseNow(Cursor& cursor, bool is_definition) {
 
 int ParseText(Cursor& cursor, Cda_Def& area, std::string_view sql, bool deferred) {
     EndResult(cursor);
-    cursor.parsed = cursor.compiled = cursor.definition_ran = false;
+    cursor.parsed = cursor.compiled = cursor.described = cursor.definition_ran = false;
     cursor.highest_define = 0;
     cursor.rows = cursor.rows_before = 0;
     cursor.pieces.clear();
@@ -86,10 +89,12 @@ int ParseText(Cursor& cursor, Cda_Def& area, std::string_view sql, bool deferred
 
 // ---- Running
 
+sword ColumnCount(const Cursor& cursor) { return static_cast<sword>(Attribute<ub4>(cursor, OCI_ATTR_PARAM_COUNT)); }
+
 // A query opens; a column that is defined must be there.
 int Opened(Cursor& cursor) {
     cursor.has_result = true;
-    if (cursor.highest_define <= static_cast<sword>(Attribute<ub4>(cursor, OCI_ATTR_PARAM_COUNT))) return 0;
+    if (cursor.highest_define <= ColumnCount(cursor)) return 0;
     EndResult(cursor);
     return errors::kNoSuchColumn;
 }
@@ -126,6 +131,35 @@ int FetchRows(Cursor& cursor, Cda_Def& area, sword rows) {
     return result;
 }
 
+// Fetches into the elements and ends, whether or not there are more rows.
+int FetchExactly(Cursor& cursor, Cda_Def& area, ub4 rows) {
+    cursor.rows = cursor.rows_before = 0;
+    area.rpc = 0;
+    if (cursor.waits == Cursor::Waits::no) {
+        if (const int failed = Compile(cursor)) {
+            NoteOffset(cursor, area);
+            return failed;
+        }
+        if (!cursor.has_result && cursor.highest_define > ColumnCount(cursor)) return errors::kNoSuchColumn;
+    }
+    int result = RunStatement(cursor, rows, 0, RunMode(cursor) | OCI_EXACT_FETCH);
+    area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROWS_FETCHED);
+    result = AskForPiece(cursor, result, Cursor::Waits::execute);
+    if (cursor.waits != Cursor::Waits::no) return result;
+    cursor.has_result = true;
+    EndResult(cursor);
+    return result;
+}
+
+int RunAndFetch(Cursor& cursor, Cda_Def& area, sword rows, bool cancel) {
+    if (cursor.waits != Cursor::Waits::fetch) {
+        if (const int failed = Run(cursor, area, 0, 0)) return failed;
+    }
+    const int result = FetchRows(cursor, area, rows);
+    if (cancel && cursor.waits == Cursor::Waits::no) EndResult(cursor);
+    return result;
+}
+
 // ---- Describing
 
 template <class Value>
@@ -153,11 +187,9 @@ void PutName(dvoid* column, const Cursor& cursor, const ColumnPlaces& places) {
 }
 
 int DescribeColumn(Cursor& cursor, Cda_Def& area, sword position, const ColumnPlaces& places) {
-    if (!cursor.has_result) {
-        if (const int failed = Compile(cursor)) {
-            NoteOffset(cursor, area);
-            return failed;
-        }
+    if (const int failed = Compile(cursor)) {
+        NoteOffset(cursor, area);
+        return failed;
     }
     dvoid* column = nullptr;
     if (!cursor.is_query || position < 1 ||
@@ -182,6 +214,14 @@ void End(const std::shared_ptr<Cursor>& cursor) {
 }
 
 }  // namespace
+
+int Compile(Cursor& cursor) {
+    if (cursor.has_result || (cursor.is_query ? cursor.described : cursor.compiled)) return 0;
+    const int result = RunStatement(cursor, 0, 0, cursor.is_query ? OCI_DESCRIBE_ONLY : OCI_PARSE_ONLY);
+    cursor.compiled = result == 0;
+    cursor.described = cursor.compiled && cursor.is_query;
+    return result;
+}
 
 sword OpenCursor(Cda_Def* area, Lda_Def* login_area) {
     const std::shared_ptr<Login> login = FindLogin(login_area);
@@ -228,6 +268,16 @@ sword ExecuteRows(Cda_Def* area, sword iterations, sword first) {
             return errors::kNoIterations;
         }
         return Run(cursor, *area, some ? static_cast<ub4>(iterations) : 1, some ? static_cast<ub4>(first) : 0);
+    });
+}
+
+sword ExecuteAndFetch(Cda_Def* area, ub4 rows, bool cancel, bool exact) {
+    return OnStatement(area, Function::oexfet, [&](Cursor& cursor) -> int {
+        area->rpc = 0;
+        if (!cursor.is_query) return errors::kFetchOutOfSequence;
+        if (rows == 0) return errors::kNoIterations;
+        if (rows > static_cast<ub4>(std::numeric_limits<sword>::max())) return errors::kParameterOutOfRange;
+        return exact ? FetchExactly(cursor, *area, rows) : RunAndFetch(cursor, *area, static_cast<sword>(rows), cancel);
     });
 }
 

@@ -10,6 +10,7 @@ sword CloseCursor(Cda_Def* area);
 sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 language);
 sword Execute(Cda_Def* area);
 sword ExecuteRows(Cda_Def* area, sword iterations, sword first);
+sword ExecuteAndFetch(Cda_Def* area, ub4 rows, bool cancel, bool exact);
 sword Fetch(Cda_Def* area, sword rows);
 sword Cancel(Cda_Def* area);
 
@@ -43,8 +44,21 @@ struct Table {
     ub4 most = 0;
     ub4* current = nullptr;
 };
-sword Define(Cda_Def* area, Function function, sword position, Place place);
-sword BindName(Cda_Def* area, Function function, Name name, Place place, Table table);
+// How the elements of arrays follow each other, or pieces: then the value is a context that ogetpi hands back.
+struct Steps {
+    ub1 opcode;
+    sb4 value;
+    sb4 indicator;
+    sb4 length;
+    sb4 code;
+};
+// `steps` null: plain arrays.
+sword Define(Cda_Def* area, Function function, sword position, Place place, const Steps* steps = nullptr);
+sword BindName(Cda_Def* area, Function function, Name name, Place place, Table table, const Steps* steps = nullptr);
 sword BindNumber(Cda_Def* area, sword number, Place place);
+sword GetPiece(Cda_Def* area, ub1* piece, dvoid** context, ub4* iteration, ub4* index);
+sword SetPiece(Cda_Def* area, ub1 piece, dvoid* buffer, ub4* length);
+// Gets the columns of a query that is compiled.
+int Compile(Cursor& cursor);
 
 }  // namespace legacy

@@ -128,10 +128,38 @@ sword LogOn(Lda_Def* area, bool has_host_area, TextArgument user, TextArgument p
     }));
 }
 
+void Borrow(Lda_Def* area, OCISvcCtx* service) {
+    if (!area || FindCursor(area)) return;
+    if (const std::shared_ptr<Login> login = FindLogin(area)) {
+        if (!login->borrowed) return (void)OnLogin(area, [](Login&) { return errors::kAlreadyLoggedOn; });
+        (void)LogOff(area);
+    }
+    std::memset(area, 0, sizeof *area);
+    (void)SetResult(*area, Function::none, Guarded([&]() -> int {
+        if (!service) return errors::kNotLoggedOn;
+        const auto login = std::make_shared<Login>();
+        if (!login->Open()) return errors::kOutOfMemory;
+        login->service = service;
+        login->borrowed = true;
+        Enter(area, login);
+        return 0;
+    }));
+}
+
+// No engine has stored procedures.
+sword DescribeProcedure(Lda_Def* area, const text* name, ub4* count) {
+    return OnLogin(area, [&](Login&) -> int {
+        if (!name) return errors::kParameterMissing;
+        if (count) *count = 0;
+        return errors::kNoSuchObject;
+    });
+}
+
 // A session that is gone has nothing to commit: the area is forgotten all the same.
 sword LogOff(Lda_Def* area) {
-    return OnLogin(area, [area](Login& login) {
-        const int result = Outcome(OCILogoff(login.service, login.error), login.error, login);
+    return OnLogin(area, [area](Login& login) -> int {
+        const int result =
+            login.borrowed ? 0 : Outcome(OCILogoff(login.service, login.error), login.error, login);
         if (result != 0 && !IsGone(result)) return result;
         std::vector<std::shared_ptr<Cursor>> cursors;
         (void)ForgetLogin(area, cursors);

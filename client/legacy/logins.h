@@ -13,6 +13,10 @@ struct TextArgument {
 
 sword LogOn(Lda_Def* area, bool has_host_area, TextArgument user, TextArgument password, TextArgument database,
             ub4 mode);
+// A session of another's: the area is a login on it until it is logged off, which leaves the session alone. Without a
+// service context `rc` is 1012 and the area is not known.
+void Borrow(Lda_Def* area, OCISvcCtx* service);
+sword DescribeProcedure(Lda_Def* area, const text* name, ub4* count);
 sword LogOff(Lda_Def* area);
 sword Commit(Lda_Def* area);
 sword Rollback(Lda_Def* area);
