@@ -42,6 +42,7 @@ bool Login::Open() {
 }
 
 Cursor::~Cursor() {
+    if (row_id) (void)OCIDescriptorFree(row_id, OCI_DTYPE_ROWID);
     if (statement) (void)OCIHandleFree(statement, OCI_HTYPE_STMT);
     if (error) (void)OCIHandleFree(error, OCI_HTYPE_ERROR);
 }
@@ -52,6 +53,8 @@ bool Cursor::Open() {
     error = static_cast<OCIError*>(handle);
     if (OCIHandleAlloc(login->environment, &handle, OCI_HTYPE_STMT, 0, nullptr) != OCI_SUCCESS) return false;
     statement = static_cast<OCIStmt*>(handle);
+    if (OCIDescriptorAlloc(login->environment, &handle, OCI_DTYPE_ROWID, 0, nullptr) != OCI_SUCCESS) return false;
+    row_id = static_cast<OCIRowid*>(handle);
     return true;
 }
 

@@ -62,6 +62,7 @@ public:
     bool ended = false;
     OCIStmt* statement = nullptr;
     OCIError* error = nullptr;
+    OCIRowid* row_id = nullptr;
 
     // Of the statement that was parsed last.
     bool parsed = false;

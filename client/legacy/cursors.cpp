@@ -9,6 +9,7 @@
 #include "handles/gate.h"
 #include "sql/statement_text.h"
 #include "statements/statement.h"
+#include "values/rowid_descriptor.h"
 
 namespace legacy {
 namespace {
@@ -99,9 +100,24 @@ int Opened(Cursor& cursor) {
     return errors::kNoSuchColumn;
 }
 
+// The engine's row number, of the row that a change of one touched.
+void NoteRow(const Cursor& cursor, Cda_Def& area) {
+    if (OCIAttrGet(cursor.statement, OCI_HTYPE_STMT, cursor.row_id, nullptr, OCI_ATTR_ROWID, cursor.error) != OCI_SUCCESS) {
+        return;
+    }
+    const CallInFlight call;
+    const auto* const row_id = Live<RowIdDescriptor>(cursor.row_id);
+    if (!row_id || !row_id->value) return;
+    const auto row = static_cast<std::uint64_t>(row_id->value->row);
+    area.rid.rcs8 = static_cast<ub2>(row);
+    area.rid.rcs7 = static_cast<ub4>(row >> 16);
+    area.rid.rd.rcs5 = static_cast<ub2>(row >> 48);
+}
+
 int Run(Cursor& cursor, Cda_Def& area, ub4 iterations, ub4 first) {
     cursor.rows = cursor.rows_before = 0;
     area.rpc = 0;
+    area.rid = {};
     if (std::exchange(cursor.definition_ran, false)) return 0;
     cursor.has_result = false;
     const bool goes_on = cursor.waits == Cursor::Waits::execute;
@@ -112,6 +128,7 @@ int Run(Cursor& cursor, Cda_Def& area, ub4 iterations, ub4 first) {
     if (result == 0) cursor.compiled = true;
     else if (!goes_on) NoteOffset(cursor, area);
     if (!cursor.is_query) area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROW_COUNT);
+    if (result == 0 && area.rpc == 1 && !cursor.is_query) NoteRow(cursor, area);
     return result == 0 && cursor.is_query ? Opened(cursor) : result;
 }
 

@@ -101,7 +101,10 @@ TEST_F(LegacyCalls, LoginsSwitchTheirModesAndEndTheirCursors) {
     EXPECT_EQ(orol(&lda), 0);
     EXPECT_EQ(Parse("delete from t"), 0);
     EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(cda.rpc, 2u);
+    EXPECT_EQ(std::make_tuple(cda.rpc, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(2u, 0u, 0));
+    ASSERT_EQ(Parse("insert into t (rowid, n) values (1 * 65536 * 65536 * 65536 + 131075, 1)"), 0);
+    EXPECT_EQ(oexec(&cda), 0);
+    EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(1, 2u, 3));
     ub4 count = 5;
     EXPECT_EQ(odessp(&lda, T("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
                      nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &count), 4043);
