@@ -54,7 +54,9 @@ Cda_Def* EnterArea(Kind kind, const std::string& name, Lda_Def* parent = nullptr
 
 TEST(Registry, AreasStayWhereTheyAreUntilTheyAreReleased) {
     Cda_Def* cursor = nullptr;
-    for (const auto& [kind, word] : {std::pair{Kind::cursor, "cursor"}, {Kind::ldainfo, "ldainfo"}}) {
+    for (const auto& pair : {std::pair{Kind::cursor, "cursor"}, {Kind::ldainfo, "ldainfo"}}) {
+        const auto kind = pair.first;
+        const char* const word = pair.second;
         for (int number = 0; number < 30; ++number) EnterArea(kind, "n" + std::to_string(number));
         EXPECT_EQ(Printed([&] { EXPECT_NE(EnterArea(kind, "one more"), nullptr); }),
                   std::string("Reached max ") + word + " count - 30\n");

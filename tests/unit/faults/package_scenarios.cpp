@@ -153,9 +153,10 @@ void CharacterSets(World& w) {
     const ub2 set = kSets[next++ % std::size(kSets)];
     char text[8] = "";
     size_t length = 0;
-    for (const auto& [to, from] : {std::pair<ub2, ub2>{set, 873}, {873, set}}) {
+    const struct { ub2 to, from; } ways[] = {{set, 873}, {873, set}};
+    for (const auto& way : ways) {
         w.Step("OCINlsCharSetConvert", [&] {
-            return OCINlsCharSetConvert(w.env, w.err, to, text, sizeof text, from, "ab", 2, &length);
+            return OCINlsCharSetConvert(w.env, w.err, way.to, text, sizeof text, way.from, "ab", 2, &length);
         }, Told::error_handle, kUnknownSet);
         w.See({text, length});
     }

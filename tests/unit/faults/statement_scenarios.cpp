@@ -510,10 +510,12 @@ void DescribedColumns(World& w) {
 // An object, its list and a member, in UTF-16; a description that fails leaves none behind, and the handle serves anew.
 void DescribeTable(World& w) {
     auto* describe = w.New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
-    for (const auto& [name, size, type] : {std::tuple{u"main", 8u, OCI_PTYPE_SCHEMA}, {u"t", 2u, OCI_PTYPE_TABLE}}) {
+    const struct { const char16_t* name; ub4 size; ub1 type; } objects[] = {
+        {u"main", 8, OCI_PTYPE_SCHEMA}, {u"t", 2, OCI_PTYPE_TABLE}};
+    for (const auto& object : objects) {
         w.Step("OCIDescribeAny", [&] {
-            return OCIDescribeAny(w.svc, w.err, const_cast<char16_t*>(name), size, OCI_OTYPE_NAME, OCI_DEFAULT,
-                                  static_cast<ub1>(type), describe);
+            return OCIDescribeAny(w.svc, w.err, const_cast<char16_t*>(object.name), object.size, OCI_OTYPE_NAME,
+                                  OCI_DEFAULT, object.type, describe);
         });
     }
     auto* const root = w.Attribute<dvoid*>(OCI_ATTR_PARAM, describe, OCI_HTYPE_DESCRIBE);

@@ -223,14 +223,17 @@ TEST_F(Dynamic, PollingBesideCallbacks) {
     OCIBind* last = nullptr;
     ASSERT_EQ(Bind(&last, 4, InPieces(SQLT_CHR)), 0);
     ASSERT_EQ(Answer(OCIBindDynamic(last, err, nullptr, nullptr, &taker, Callback::Out)), 0);
+    ub4 length = 0;
+    char buffer[3] = "";
     for (ub4 row = 0; row < 2; ++row) {
         for (const ub1 direction : {OCI_PARAM_IN, OCI_PARAM_OUT}) {
             const bool waits = row == 1 && direction == OCI_PARAM_IN;
             EXPECT_EQ(waits ? OCI_NEED_DATA : ExecuteCode(2), OCI_NEED_DATA);
             dvoid* handle = nullptr;
-            ub4 iteration = 9, index = 9, length = 2;
+            ub4 iteration = 9, index = 9;
             ub1 in_out = 0;
-            char buffer[] = "b0";
+            length = 2;
+            std::strcpy(buffer, "b0");
             ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, nullptr, &in_out, &iteration, &index, nullptr)), 0);
             EXPECT_EQ(handle, binds_[direction == OCI_PARAM_IN ? 2 : 3]);
             EXPECT_EQ(in_out, direction);

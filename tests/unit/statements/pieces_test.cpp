@@ -156,9 +156,9 @@ TEST_F(PieceByPiece, BindsMadeAnewAskAnew) {
     MustRun("create table u(a varchar2(9), b varchar2(9), c varchar2(9))");
     OCIBind *x = nullptr, *y = nullptr;
     ASSERT_EQ(Prepare("insert into u values(:x, :y, :x)"), 0);
+    ub4 length = 1;
     for (const char* data : {"pq", "ab"}) {
         ASSERT_EQ(BindName(&x, "x", InPieces(SQLT_CHR)) + BindName(&y, "y", InPieces(SQLT_CHR)), 0);
-        ub4 length = 1;
         for (int value = 0; value < 2; ++value) {
             ASSERT_EQ(ExecuteCode(), OCI_NEED_DATA) << data[value];
             ASSERT_EQ(Set(data + value, &length, OCI_ONE_PIECE), 0);
