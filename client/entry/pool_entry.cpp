@@ -128,11 +128,17 @@ struct GetResult {
     boolean* found;
 };
 
-// The tag that the session came with, as the application reads it; whether it is the one that was wished for.
-void ShowTag(ServiceContext& service, const std::string& wished, const GetResult& result) {
-    const Session* session = service.GetSession();
+// The tag that a session came with; none when the pool has gone meanwhile, and its place with it.
+std::string TagOf(const Session* session) {
     const std::shared_ptr<Link> link = session ? session->ShareLink() : nullptr;
-    const std::string tag = link && link->Place() ? static_cast<const PoolPlace*>(link->Place())->Tag() : std::string();
+    if (!link) return {};
+    const SerialLock lock(link->Serial());
+    return !link->Closed() && link->Place() ? static_cast<const PoolPlace*>(link->Place())->Tag() : std::string();
+}
+
+// The tag as the application reads it; whether it is the one that was wished for.
+void ShowTag(ServiceContext& service, const std::string& wished, const GetResult& result) {
+    const std::string tag = TagOf(service.GetSession());
     std::string converted;
     service.tag = TextOut(service.Env(), tag, converted);
     if (result.tag) *result.tag = tag.empty() ? nullptr : reinterpret_cast<OraText*>(service.tag.data());

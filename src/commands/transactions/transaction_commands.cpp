@@ -1,4 +1,6 @@
 // Transactions of a service context: starting, leaving, preparing, ending. Command thread only.
+#include <algorithm>
+
 #include "commands/families.h"
 #include "commands/shared/handle_call.h"
 #include "core/messages.h"
@@ -48,7 +50,7 @@ void PrepareBranches(const CommandRow& row, int count, char** words) {
     const int branches = DecodeNumber(words[2]);
     if (branches < 0 || (count - 3) % 2 != 0 || (count - 3) / 2 != branches) return InvalidSyntax(row.usage);
     auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
-    const auto room = static_cast<size_t>(branches) * sizeof(void*);
+    const auto room = static_cast<size_t>(std::max(branches, 1)) * sizeof(void*);
     const Memory<OCITrans*> transactions(static_cast<OCITrans**>(GetMem(room)));
     const Memory<OCIError*> errors(static_cast<OCIError**>(GetMem(room)));
     if (!transactions || !errors) return;
