@@ -101,7 +101,7 @@ sword odessp(Lda_Def* lda, text* object, size_t, ub1*, size_t, ub1*, size_t, ub2
 
 void sqllda(Lda_Def* lda) { sqlld2(lda, nullptr, nullptr); }
 
-// The connection of a name; without a name the first.
+// The connection of a name; a null one is that of the connection without a name.
 void sqlld2(Lda_Def* lda, text* dbName, sb4* dbNameLen) {
     const CallInFlight call;
     OCISvcCtx* service = nullptr;
