@@ -215,7 +215,7 @@ int DescribeColumn(Cursor& cursor, Cda_Def& area, sword position, const ColumnPl
     }
     Put(places.size, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DATA_SIZE));
     Put(places.type, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DATA_TYPE));
-    Put(places.display_size, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DISP_SIZE));
+    Put(places.display_size, ColumnAttribute<ub4>(column, cursor, OCI_ATTR_DISP_SIZE));
     Put(places.precision, ColumnAttribute<sb2>(column, cursor, OCI_ATTR_PRECISION));
     Put(places.scale, ColumnAttribute<sb1>(column, cursor, OCI_ATTR_SCALE));
     Put(places.null_ok, ColumnAttribute<ub1>(column, cursor, OCI_ATTR_IS_NULL) != 0 ? 1 : 0);
