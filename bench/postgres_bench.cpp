@@ -1,5 +1,5 @@
 // The same on PostgreSQL, beside libpq in the same run: rows inserted by array binds beside a pipelined loop, rows fetched
-// beside single-row mode, and round trips. Of the fetch, how much memory it took, too. Run it with tools/cluster run.
+// beside single-row mode, round trips, and branches prepared and committed. Of the fetch, how much memory it took, too. Run it with tools/cluster run.
 //   postgres_bench [runs]
 #include <libpq-fe.h>
 #include <sys/resource.h>
@@ -7,6 +7,7 @@
 #include <cstdlib>
 
 #include "client_work.h"
+#include "xa.h"
 
 namespace {
 
@@ -93,6 +94,25 @@ long MostMemory() {
     return usage.ru_maxrss;
 }
 
+// A branch of a global transaction in which a row changes: prepared, then committed.
+void PrepareAndCommit(const Session& session, int pairs) {
+    OCITrans* trans = nullptr;
+    OCIHandleAlloc(session.env, reinterpret_cast<dvoid**>(&trans), OCI_HTYPE_TRANS, 0, nullptr);
+    session.Check(OCIAttrSet(session.svc, OCI_HTYPE_SVCCTX, trans, 0, OCI_ATTR_TRANS, session.err));
+    session.Prepare("insert into t(id) values(1)");
+    for (int pair = 0; pair < pairs; ++pair) {
+        XID xid{.formatID = 7, .gtrid_length = sizeof pair, .bqual_length = 1, .data = {}};
+        std::memcpy(xid.data, &pair, sizeof pair);
+        session.Check(OCIAttrSet(trans, OCI_HTYPE_TRANS, &xid, sizeof xid, OCI_ATTR_XID, session.err));
+        session.Check(OCITransStart(session.svc, session.err, 60, OCI_TRANS_NEW));
+        session.Check(OCIStmtExecute(session.svc, session.stmt, session.err, 1, 0, nullptr, nullptr, OCI_DEFAULT));
+        session.Check(OCITransPrepare(session.svc, session.err, OCI_DEFAULT));
+        session.Check(OCITransCommit(session.svc, session.err, OCI_TRANS_TWOPHASE));
+    }
+    session.Check(OCIAttrSet(session.svc, OCI_HTYPE_SVCCTX, nullptr, 0, OCI_ATTR_TRANS, session.err));
+    OCIHandleFree(trans, OCI_HTYPE_TRANS);
+}
+
 void Measure(int runs) {
     const char* const url = std::getenv("KELP_POSTGRES");
     if (!url) Fail("no cluster: run this with tools/cluster run");
@@ -131,6 +151,13 @@ void Measure(int runs) {
          [&] {
              for (int trip = 0; trip < kTrips / 5; ++trip)
                  for (const char* sql : {"begin", "insert into t(id) values(1)", "commit"}) bare.Run(sql);
+         });
+    Pair("PostgreSQL: a branch prepared and committed / libpq", 1.2, runs, [&] { PrepareAndCommit(session, kTrips / 5); },
+         [&] {
+             for (int pair = 0; pair < kTrips / 5; ++pair)
+                 for (const char* sql : {"begin", "insert into t(id) values(1)", "prepare transaction 'pair'",
+                                         "commit prepared 'pair'"})
+                     bare.Run(sql);
          });
 }
 
