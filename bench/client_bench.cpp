@@ -1,5 +1,6 @@
 // What a user of the client library would notice, each beside the same work on the engine's own interface in the same
-// run: rows inserted by array binds, rows fetched into array defines and in pieces. Prints the median of the paired ratios.
+// run: rows inserted by array binds, rows fetched into array defines and in pieces, large objects. Prints the median of the
+// paired ratios.
 //   client_bench [runs]
 #include <sqlite3.h>
 
@@ -210,6 +211,120 @@ private:
     ub4 length_ = 0;
 };
 
+// ---- Large objects: one value, written and read in pieces of 64 KB
+
+constexpr ub4 kLobPiece = 65536;
+constexpr ub8 kLobPieces = 512;
+
+struct LobKind {
+    const char* name;
+    const char* empty;
+    ub2 type;
+};
+constexpr LobKind kBlob{"blob", "x''", SQLT_BLOB}, kClob{"clob", "''", SQLT_CLOB};
+const char* const kUpdate = " for update";
+
+// Whole characters, some of them of two bytes: they serve as binary data, too.
+std::string LobData() {
+    std::string data;
+    while (data.size() < kLobPiece) data += "thirty bytes in plain letters, \xC3\xA4";
+    data.resize(kLobPiece - 2);
+    return data += "ok";
+}
+
+// A table of its own for each kind, with one row.
+void CreateLobs(const Bare& bare) {
+    bare.Run("create table of_blob(v blob)");
+    bare.Run("create table of_clob(v clob)");
+    bare.Run("insert into of_blob values(x'')");
+    bare.Run("insert into of_clob values('')");
+}
+
+class LobOfLibrary {
+public:
+    LobOfLibrary(const Session& session, LobKind kind) : session_(session), kind_(kind) {
+        OCIDescriptorAlloc(session.env, reinterpret_cast<dvoid**>(&lob_), OCI_DTYPE_LOB, 0, nullptr);
+    }
+    ~LobOfLibrary() { OCIDescriptorFree(lob_, OCI_DTYPE_LOB); }
+    LobOfLibrary(const LobOfLibrary&) = delete;
+    LobOfLibrary& operator=(const LobOfLibrary&) = delete;
+
+    // Grows from nothing.
+    void Write() {
+        session_.Execute((std::string("update of_") + kind_.name + " set v = " + kind_.empty).c_str());
+        Fetch(kUpdate);
+        for (ub8 done = 1; done <= kLobPieces; ++done) {
+            ub4 amount = 0;
+            const ub1 piece = done == 1 ? OCI_FIRST_PIECE : done < kLobPieces ? OCI_NEXT_PIECE : OCI_LAST_PIECE;
+            const sword rc = OCILobWrite(session_.svc, session_.err, lob_, &amount, 1, data_.data(), kLobPiece, piece,
+                                         nullptr, nullptr, 0, SQLCS_IMPLICIT);
+            if (rc != OCI_NEED_DATA) session_.Check(rc);
+        }
+        session_.Check(OCITransCommit(session_.svc, session_.err, OCI_DEFAULT));
+    }
+    // Outside of a transaction the fetch keeps a copy, so that it is read as it was.
+    ub8 Read(const char* ending) {
+        Fetch(ending);
+        ub8 bytes = 0;
+        for (sword rc = OCI_NEED_DATA; rc == OCI_NEED_DATA;) {
+            ub4 amount = 0;
+            rc = OCILobRead(session_.svc, session_.err, lob_, &amount, 1, data_.data(), kLobPiece, nullptr, nullptr, 0,
+                            SQLCS_IMPLICIT);
+            if (rc != OCI_NEED_DATA) session_.Check(rc);
+            bytes += amount;
+        }
+        session_.Check(OCITransCommit(session_.svc, session_.err, OCI_DEFAULT));
+        return bytes;
+    }
+
+private:
+    void Fetch(const char* ending) {
+        session_.Prepare((std::string("select v from of_") + kind_.name + ending).c_str());
+        OCIDefine* define = nullptr;
+        session_.Check(OCIDefineByPos(session_.stmt, &define, session_.err, 1, &lob_, -1, kind_.type, nullptr, nullptr,
+                                      nullptr, OCI_DEFAULT));
+        session_.Check(OCIStmtExecute(session_.svc, session_.stmt, session_.err, 1, 0, nullptr, nullptr, OCI_DEFAULT));
+    }
+    const Session& session_;
+    const LobKind kind_;
+    OCILobLocator* lob_ = nullptr;
+    std::string data_ = LobData();
+};
+
+template <class Move>
+void LobBare(const Bare& bare, LobKind kind, bool writes, Move move) {
+    sqlite3_blob* blob = nullptr;
+    const std::string table = std::string("of_") + kind.name;
+    bare.Run("begin");
+    if (writes) bare.Run(("update " + table + " set v = zeroblob(512 * 65536)").c_str());
+    if (sqlite3_blob_open(bare.database, "main", table.c_str(), "v", 1, writes, &blob) != SQLITE_OK) Fail("no value");
+    for (ub8 done = 0; done < kLobPieces; ++done)
+        if (move(blob, static_cast<int>(done * kLobPiece)) != SQLITE_OK) Fail(sqlite3_errmsg(bare.database));
+    sqlite3_blob_close(blob);
+    bare.Run("commit");
+}
+
+void PairLobs(const std::string& folder, int runs) {
+    const std::string file = folder + "/lobs.db";
+    const Bare bare(folder + "/bare_lobs.db");
+    CreateLobs(bare);
+    CreateLobs(Bare(file));
+    const Session session(file);
+    std::string data = LobData();
+    for (const LobKind kind : {kBlob, kClob}) {
+        LobOfLibrary lob(session, kind);
+        const auto title = [&](const char* what) { return std::string(kind.name) + " of 32 MB " + what + " / bare blob"; };
+        const auto write = [&](sqlite3_blob* blob, int at) { return sqlite3_blob_write(blob, data.data(), kLobPiece, at); };
+        const auto read = [&](sqlite3_blob* blob, int at) { return sqlite3_blob_read(blob, data.data(), kLobPiece, at); };
+        const auto whole = [](ub8 bytes) { if (bytes != kLobPieces * kLobPiece) Fail("not every byte came back"); };
+        Pair(title("written by 64 KB").c_str(), 2.0, runs, [&] { lob.Write(); }, [&] { LobBare(bare, kind, true, write); });
+        Pair(title("read by 64 KB").c_str(), 2.0, runs,
+             [&] { whole(lob.Read(kUpdate)); }, [&] { LobBare(bare, kind, false, read); });
+        Pair(title("copied at fetch, read").c_str(), 2.0, runs,
+             [&] { whole(lob.Read("")); }, [&] { LobBare(bare, kind, false, read); });
+    }
+}
+
 void Run(const std::string& folder, int runs) {
     WarmPool pool(folder + "/pool.db");
     const auto times = [](int count, auto work) { for (int done = 0; done < count; ++done) work(); };
@@ -232,6 +347,7 @@ void Run(const std::string& folder, int runs) {
          [&] { whole(PiecesByCallback(session)); }, [&] { whole(PiecesBare(bare)); });
     Pair("pieces of 200,000 rows by polling / bare loop", 3.0, runs,
          [&] { whole(PiecesByPolling(session)); }, [&] { whole(PiecesBare(bare)); });
+    PairLobs(folder, runs);
 }
 
 }  // namespace

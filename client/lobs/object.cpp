@@ -1,6 +1,8 @@
 #include "lobs/object.h"
 
 #include <algorithm>
+#include <array>
+#include <cstring>
 
 #include "handles/errors.h"
 #include "platform/utf.h"
@@ -13,10 +15,25 @@ bool Begins(char byte) { return (static_cast<unsigned char>(byte) & 0xC0) != 0x8
 std::span<std::byte> Bytes(std::string& text) { return std::as_writable_bytes(std::span(text)); }
 std::span<const std::byte> Bytes(std::string_view text) { return std::as_bytes(std::span(text)); }
 
+constexpr std::size_t kWords = 128;    // whose counts fit into a byte each
+constexpr std::uint64_t kOnes = 0x0101010101010101;
+
+// The bytes that go on with a character, of which the highest two bits are 10, eight at a time.
+std::uint64_t CountContinuations(const char* text) {
+    std::array<std::uint64_t, kWords> words;
+    std::memcpy(words.data(), text, sizeof words);
+    std::uint64_t counts = 0;
+    for (const std::uint64_t word : words) counts += (word >> 7) & ~(word >> 6) & kOnes;
+    constexpr std::uint64_t kPairs = 0x00FF00FF00FF00FF;
+    return (((counts & kPairs) + ((counts >> 8) & kPairs)) * 0x0001000100010001) >> 48;
+}
+
 }  // namespace
 
 std::uint64_t CountCharacters(std::string_view text) {
-    return static_cast<std::uint64_t>(std::count_if(text.begin(), text.end(), Begins));
+    std::uint64_t count = text.size();
+    for (; text.size() >= kWords * 8; text.remove_prefix(kWords * 8)) count -= CountContinuations(text.data());
+    return count - text.size() + static_cast<std::uint64_t>(std::count_if(text.begin(), text.end(), Begins));
 }
 
 LargeObject::LargeObject(LobDescriptor& descriptor, values::Located located) : located_(std::move(located)) {
@@ -96,18 +113,13 @@ Status LargeObject::Read(std::uint64_t bytes, std::size_t most_bytes, std::uint6
     units = 0;
     const std::uint64_t widest = HasCharacters() ? 4 : 1;
     const std::uint64_t wanted = most_units > most_bytes / widest ? most_bytes : most_units * widest;
-    text.resize(static_cast<std::size_t>(wanted));
+    // Of characters one byte more: the last one may go on there.
+    text.resize(static_cast<std::size_t>(wanted) + (HasCharacters() && wanted > 0 ? 1 : 0));
     std::size_t read = 0;
     if (Status status = Lob().Read(bytes, Bytes(text), read); status.Failed()) return status;
-    const bool at_end = read < text.size();
     text.resize(read);
     if (!HasCharacters()) return units = read, Status();
-    if (!at_end && read > 0) {    // the last character may go on behind it
-        std::string next(1, '\0');
-        if (Status status = Lob().Read(bytes + read, Bytes(next), read); status.Failed()) return status;
-        if (read == 1) text += next;
-        text.resize(read == 1 ? utf::WholeUtf8(text, text.size() - 1) : text.size());
-    }
+    if (read > wanted) text.resize(utf::WholeUtf8(text, static_cast<std::size_t>(wanted)));
     units = CountCharacters(text);
     for (std::size_t at = text.size(); units > most_units && at-- > 0;) {
         if (!Begins(text[at])) continue;

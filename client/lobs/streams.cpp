@@ -25,6 +25,7 @@ struct Stream {
     std::uint64_t byte = 0;              // where it is read
     std::uint64_t units = 0;             // transferred so far
     std::uint64_t bytes = 0;             // in the application's form
+    std::string block;                   // read last; kept for its room
     std::string torn;                    // of units of two bytes: what the last piece began of a character
 };
 
@@ -100,7 +101,7 @@ Status ReadBlock(Stream& stream, char* out, std::uint64_t room, Transferred& don
         most_units = std::min(most_units, std::max<std::uint64_t>(std::min<std::uint64_t>(room, kBlock) / widest, 1));
         most_bytes = kBlock;
     }
-    std::string block;
+    std::string& block = stream.block;
     std::string converted;
     done = {};
     Status status = stream.object.Read(stream.byte, static_cast<std::size_t>(most_bytes), most_units, block, done.units);

@@ -73,6 +73,12 @@ TEST_F(Lobs, CharactersAreCounted) {
     MustRun("rollback");
     EXPECT_EQ(Stored(), "h\xC3\xA4llo world");
     EXPECT_EQ(Write(lob, 1, "x"), 22990);
+    std::string many = "\xC3\xA4";                             // of every width, at every place in a word
+    for (int count = 0; count < 1000; ++count) many += "a\xE2\x82\xAC\xF0\x90\x8D\x88" "ab";
+    Temporary(other);
+    EXPECT_EQ(Write(other, 1, many), 0);
+    EXPECT_EQ(LengthOf(other), 5001u);
+    EXPECT_EQ(Read(other, 3, 4998), "3:\xE2\x82\xAC\xF0\x90\x8D\x88" "a");
 }
 
 TEST_F(Lobs, Utf16IsConvertedBothWays) {
