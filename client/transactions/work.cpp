@@ -144,10 +144,11 @@ Status TakeUp(Link& link, const BranchPointer& held, Family family) {
     return {};
 }
 
-Status Leave(Link& link, Rest rest) {
+Status Leave(Link& link, Rest rest, int* doom) {
     Hold hold(link, WorkingIn(link)->Get(), true);
     Note(*hold.branch->work, link.Engine().InTransaction());
     if (Status status = SetAside(link, *hold.branch->work); !status.Ok()) return status;
+    if (doom) *doom = hold.branch->work->doom;    // from here on it may be another's
     LetRest(hold, rest);
     return {};
 }

@@ -61,8 +61,8 @@ struct NewBranch {
 Status Begin(Link& link, const NewBranch& branch, Family family);
 Status TakeUp(Link& link, const BranchPointer& held, Family family);
 // The session leaves the branch that it works in. On failure it still works in it: 24782 where the database has one
-// connection.
-Status Leave(Link& link, Rest rest);
+// connection. `doom`: why the branch that is left is to be rolled back, if it is.
+Status Leave(Link& link, Rest rest, int* doom = nullptr);
 
 // Each finishes the branch or lets it rest; only a failure that has changed nothing leaves a working one as it was. A
 // branch that is doomed is rolled back, and why is the answer.

@@ -117,8 +117,9 @@ Answer EndWork(const Call& call, xa_long flags) {
     if (flags & TMFAIL) Doom(&link.Engine(), *branch);
     branch->migrates = flags & TMMIGRATE;
     branch->suspended_by = branch->migrates ? nullptr : call.manager.get();
-    Status status = transactions::Leave(link, flags & TMSUSPEND ? Rest::suspended : Rest::idle);
-    if (status.Ok() && !(flags & TMFAIL) && branch->work->doom != 0) return AnswerOf(Error(branch->work->doom));
+    int doom = 0;
+    Status status = transactions::Leave(link, flags & TMSUSPEND ? Rest::suspended : Rest::idle, &doom);
+    if (status.Ok() && !(flags & TMFAIL) && doom != 0) return AnswerOf(Error(doom));
     return AnswerOf(std::move(status));
 }
 
