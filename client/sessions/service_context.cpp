@@ -122,7 +122,7 @@ Status ServiceContext::LogOn(const Target& target, const engine::Credentials& cr
     const SerialLock changing(changing_);
     if (logged_on_) {
         Status ended = LogOff();
-        if (ended.Failed()) return ended;
+        if (ended.Failed() && logged_on_) return ended;
     }
     Server& server = OwnServer();
     Session& session = OwnSession();
@@ -149,7 +149,9 @@ Status ServiceContext::LogOff() {
     Status status = Require(link);
     if (status.Failed()) return status;
     status = session ? session->End() : Error(errors::kNotLoggedOn);
-    return status.Failed() || !logged_on_ ? status : Forget();
+    if (!logged_on_ || (status.Failed() && session && session->Begun())) return status;
+    const Status detached = Forget();
+    return status.Failed() ? status : detached;
 }
 
 Status ServiceContext::Release(GivingBack how) {

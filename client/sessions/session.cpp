@@ -87,7 +87,7 @@ Status Session::End(GivingBack* released) {
     const Turn turn(*this);
     if (!turn.link) return Error(errors::kNotLoggedOn);
     Status status = turn.link->Commit();
-    if (status.Failed() && !(released && turn.link->Engine().Broken())) return status;
+    if (status.Failed() && !turn.link->Engine().Broken()) return status;    // a lost one has ended already
     turn.link->GiveBack(released ? std::move(*released) : GivingBack());
     Leave();
     return status;

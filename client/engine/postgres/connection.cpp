@@ -42,6 +42,7 @@ Status PgConnection::Stopped() { return Refused(errors::kCancelled); }
 Status PgConnection::Enter() {
     if (wire_->Broken()) return wire_->Lost();
     if (streaming_) streaming_->ReadAhead();
+    if (wire_->Broken()) return Refused(errors::kEndOfChannel, "the connection to the server was lost");    // by this call
     const bool forgets = forgotten_.size() >= kForgottenAtOnce && !in_transaction_;    // a failure would end it
     if (!forgets) return wire_->Broken() ? wire_->Lost() : Status();
     for (const std::string& command : forgotten_) wire_->Send(command.c_str());
