@@ -263,6 +263,7 @@ Status SqliteConnection::Commit() {
     if (!InTransaction()) return {};
     const Unheeding undisturbed(*this);
     if (Status settled = lobs_.Settle(); settled.Failed()) {
+        if (settled.Number() == errors::kOutOfMemory && InTransaction()) return settled;    // nothing is lost
         const Status undone = Rollback();
         return undone.Failed() ? undone : RolledBack(settled);
     }
@@ -277,7 +278,7 @@ Status SqliteConnection::Rollback() {
     const Unheeding undisturbed(*this);
     (void)ReadAhead(nullptr);
     lobs_.Forget();
-    return Run(Own::rollback);
+    return InTransaction() ? Run(Own::rollback) : Status();
 }
 
 Status SqliteConnection::SetMark() {

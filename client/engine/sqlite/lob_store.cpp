@@ -34,12 +34,14 @@ std::string Quoted(std::string_view name) {
 Status NoValue() { return Error(errors::kNoLobValue).From("SQLITE"); }
 
 // All of an open value, in blocks.
-Status CopyValue(SqliteConnection& connection, const OpenValue& value, ChunkedBytes& bytes) {
+Status CopyValue(SqliteConnection& connection, OpenValue& value, ChunkedBytes& bytes) {
+    const bool in_transaction = connection.InTransaction();
     std::vector<std::byte> block(static_cast<std::size_t>(std::min<std::uint64_t>(value.Length(), kBlock)));
     for (std::uint64_t done = 0; done < value.Length();) {
         const auto part = static_cast<std::size_t>(std::min<std::uint64_t>(value.Length() - done, block.size()));
         const std::span read(block.data(), part);
-        if (const int code = value.Read(done, read); code != SQLITE_OK) return Failure(connection.Database(), code);
+        const int code = value.Read(done, read);
+        if (code != SQLITE_OK) return connection.Failed(code, Verb::other, in_transaction);
         if (Status status = bytes.Write(done, read); status.Failed()) return status;
         done += part;
     }
@@ -52,6 +54,7 @@ Status CopyValue(SqliteConnection& connection, const OpenValue& value, ChunkedBy
 
 Status OpenValue::Open(SqliteConnection& connection, const std::shared_ptr<const LobColumn>& column, std::int64_t row,
                        bool writes) {
+    const bool in_transaction = connection.InTransaction();
     int code = SQLITE_ABORT;
     if (blob_ && column_ == column && (writes_ || !writes)) {
         if (positioned_ && row_ == row && sqlite3_blob_read(blob_, nullptr, 0, 0) == SQLITE_OK) return {};
@@ -59,6 +62,7 @@ Status OpenValue::Open(SqliteConnection& connection, const std::shared_ptr<const
     }
     if (code != SQLITE_OK) {
         Close();
+        if (in_transaction && !connection.InTransaction()) return connection.Failed(code, Verb::other, true);
         code = sqlite3_blob_open(connection.Database(), column->schema.c_str(), column->table.c_str(),
                                  column->name.c_str(), row, writes, &blob_);
         column_ = column;
@@ -67,7 +71,7 @@ Status OpenValue::Open(SqliteConnection& connection, const std::shared_ptr<const
     row_ = row;
     positioned_ = code == SQLITE_OK;
     if (positioned_) return {};
-    Status status = (code & 0xFF) == SQLITE_ERROR ? NoValue() : Failure(connection.Database(), code);
+    Status status = (code & 0xFF) == SQLITE_ERROR ? NoValue() : connection.Failed(code, Verb::other, in_transaction);
     Close();
     return status;
 }
@@ -78,12 +82,18 @@ void OpenValue::Close() noexcept {
     positioned_ = false;
 }
 
-int OpenValue::Read(std::uint64_t offset, std::span<std::byte> out) const {
-    return sqlite3_blob_read(blob_, out.data(), static_cast<int>(out.size()), static_cast<int>(offset));
+// One that failed may take the transaction with it when it is closed: that is done at once, where it is noticed.
+int OpenValue::Closed(int code) noexcept {
+    if (code != SQLITE_OK) Close();
+    return code;
 }
 
-int OpenValue::Write(std::uint64_t offset, std::span<const std::byte> in) const {
-    return sqlite3_blob_write(blob_, in.data(), static_cast<int>(in.size()), static_cast<int>(offset));
+int OpenValue::Read(std::uint64_t offset, std::span<std::byte> out) {
+    return Closed(sqlite3_blob_read(blob_, out.data(), static_cast<int>(out.size()), static_cast<int>(offset)));
+}
+
+int OpenValue::Write(std::uint64_t offset, std::span<const std::byte> in) {
+    return Closed(sqlite3_blob_write(blob_, in.data(), static_cast<int>(in.size()), static_cast<int>(offset)));
 }
 
 // ---- The object of a column
@@ -169,8 +179,10 @@ Status ColumnLob::Read(std::uint64_t offset, std::span<std::byte> out, std::size
     if (status.Ok() && offset < Store().open_.Length()) {
         const std::uint64_t rest = Store().open_.Length() - offset;
         const std::span<std::byte> part = out.first(static_cast<std::size_t>(std::min<std::uint64_t>(out.size(), rest)));
+        SqliteConnection& connection = Store().connection_;
+        const bool in_transaction = connection.InTransaction();
         const int code = Store().open_.Read(offset, part);
-        if (code != SQLITE_OK) status = Failure(Store().connection_.Database(), code);
+        if (code != SQLITE_OK) status = connection.Failed(code, Verb::other, in_transaction);
         else read = part.size();
     }
     Store().LetGo();
@@ -208,6 +220,7 @@ Status ColumnLob::Write(std::uint64_t offset, std::span<const std::byte> in) {
             const int code = Store().open_.Write(offset, in);
             return code == SQLITE_OK ? Status() : connection.Failed(code, Verb::update, in_transaction);
         }
+        if (opened.Failed() && opened.Number() != errors::kNoLobValue) return opened;
         if (Status status = Draft(draft); status.Failed()) return status;
     }
     return draft->bytes.Write(offset, in);
@@ -394,22 +407,27 @@ void LobStore::Forget() noexcept {
 Status LobStore::Settle() {
     open_.Close();
     if (drafts_.empty()) return {};
-    const auto drafts = std::exchange(drafts_, {});
+    auto drafts = std::exchange(drafts_, {});
     if (!connection_.InTransaction()) return {};    // lost with it
-    (void)connection_.ReadAhead(nullptr);
+    const Status read = connection_.ReadAhead(nullptr);
+    if (!connection_.InTransaction()) return RolledBack(read);
     Status first;
     flushes_ = true;
-    for (const auto& draft : drafts) {
+    for (auto& draft : drafts) {
+        if (!connection_.InTransaction()) break;    // lost with one before
         Status status;
         try {
             status = Flush(*draft);
         } catch (const std::bad_alloc&) {
             status = Error(errors::kOutOfMemory).From("SQLITE");
         }
+        if (status.Number() != errors::kOutOfMemory) draft = nullptr;
         if (first.Ok()) first = std::move(status);
     }
     open_.Close();
     flushes_ = false;
+    std::erase(drafts, nullptr);
+    if (connection_.InTransaction()) drafts_ = std::move(drafts);
     return first;
 }
 

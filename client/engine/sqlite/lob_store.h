@@ -51,10 +51,12 @@ public:
     [[nodiscard]] bool IsOpen() const { return blob_ != nullptr; }
     [[nodiscard]] std::uint64_t Length() const { return static_cast<std::uint64_t>(sqlite3_blob_bytes(blob_)); }
     // Within the length.
-    [[nodiscard]] int Read(std::uint64_t offset, std::span<std::byte> out) const;
-    [[nodiscard]] int Write(std::uint64_t offset, std::span<const std::byte> in) const;
+    [[nodiscard]] int Read(std::uint64_t offset, std::span<std::byte> out);
+    [[nodiscard]] int Write(std::uint64_t offset, std::span<const std::byte> in);
 
 private:
+    int Closed(int code) noexcept;
+
     sqlite3_blob* blob_ = nullptr;
     std::shared_ptr<const LobColumn> column_;
     std::int64_t row_ = 0;
@@ -83,7 +85,8 @@ public:
 
     void LetGo() noexcept;               // of the database, unless somebody else holds it
 
-    // Drafts become values: before a statement, a mark, a commit. The values of drafts that fail stay as they were.
+    // Drafts become values: before a statement, a mark, a commit. The values of drafts that fail stay as they were;
+    // where memory failed, the drafts wait for the next time.
     Status Settle();
     void Close() noexcept { Forget(), data_version_.reset(); }
     void Forget() noexcept;              // the drafts: what they are of is undone

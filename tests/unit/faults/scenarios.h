@@ -11,11 +11,13 @@ namespace faults {
 std::span<const Scenario> HandleScenarios();
 std::span<const Scenario> StatementScenarios();
 std::span<const Scenario> FetchScenarios();
+std::span<const Scenario> LobScenarios();
 std::span<const Scenario> PackageScenarios();
 
 inline std::vector<Scenario> AllScenarios() {
     std::vector<Scenario> all;
-    for (const auto& list : {HandleScenarios(), StatementScenarios(), FetchScenarios(), PackageScenarios()}) {
+    for (const auto& list : {HandleScenarios(), StatementScenarios(), FetchScenarios(), LobScenarios(),
+                             PackageScenarios()}) {
         all.insert(all.end(), list.begin(), list.end());
     }
     return all;
