@@ -1,55 +1,20 @@
 // Chunks of a temporary file, and bytes put together from them.
 #include "engine/chunked_bytes.h"
 
-#include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <string>
 
-#include "handles/errors.h"
+#include "engine/temporary_file.h"
 
 namespace engine {
 namespace {
 
-Status FileFailed(const char* words) {
-    const bool full = errno == ENOSPC || errno == EDQUOT || errno == EFBIG;
-    return Error(full ? errors::kNoRoom : errors::kInputOutputError, words);
-}
-
-// A transfer that is cut short goes on; `move` answers like pwrite.
-template <class Move>
-bool All(std::size_t size, Move move) {
-    for (std::size_t done = 0; done < size;) {
-        errno = 0;
-        const ssize_t moved = move(done);
-        if (moved <= 0) {
-            if (moved < 0 && errno == EINTR) continue;
-            return false;
-        }
-        done += static_cast<std::size_t>(moved);
-    }
-    return true;
-}
-
-off_t Place(std::uint32_t chunk, std::size_t at) { return static_cast<off_t>(std::uint64_t{chunk} * ChunkFile::kChunk + at); }
+std::uint64_t Place(std::uint32_t chunk, std::size_t at) { return std::uint64_t{chunk} * ChunkFile::kChunk + at; }
 
 }  // namespace
-
-Status OpenTemporaryFile(int& file) {
-    const char* folder = std::getenv("TMPDIR");
-    const std::string beginning = folder && *folder ? folder : "/tmp";
-    file = ::open(beginning.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
-    if (file >= 0) return {};
-    std::string name = beginning + "/kelp-rows-XXXXXX";    // the folder's file system may know no unnamed files
-    file = ::mkostemp(name.data(), O_CLOEXEC);
-    if (file < 0) return FileFailed("no temporary file");
-    ::unlink(name.c_str());
-    return {};
-}
 
 // ---- The file
 
@@ -84,17 +49,11 @@ void ChunkFile::GiveBack(std::span<const std::uint32_t> chunks) noexcept {
 }
 
 Status ChunkFile::Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const {
-    const bool read = All(out.size(), [&](std::size_t done) {
-        return ::pread(file_, out.data() + done, out.size() - done, Place(chunk, at + done));
-    });
-    return read ? Status() : FileFailed("a temporary file cannot be read");
+    return ReadTemporaryFile(file_, Place(chunk, at), out);
 }
 
 Status ChunkFile::Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const {
-    const bool written = All(in.size(), [&](std::size_t done) {
-        return ::pwrite(file_, in.data() + done, in.size() - done, Place(chunk, at + done));
-    });
-    return written ? Status() : FileFailed("a temporary file cannot be written");
+    return WriteTemporaryFile(file_, Place(chunk, at), in);
 }
 
 std::size_t ChunkFile::Used() {

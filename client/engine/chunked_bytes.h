@@ -66,7 +66,4 @@ private:
     std::uint64_t size_ = 0;
 };
 
-// A temporary file without a name, in TMPDIR or /tmp; 1653 or 1115 when there is none to be had.
-Status OpenTemporaryFile(int& file);
-
 }  // namespace engine

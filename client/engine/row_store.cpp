@@ -4,12 +4,10 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
 #include <cstring>
 #include <type_traits>
 
-#include "engine/chunked_bytes.h"
-#include "handles/errors.h"
+#include "engine/temporary_file.h"
 
 namespace engine {
 namespace {
@@ -53,25 +51,6 @@ void View(const std::byte* at, std::span<Datum> values) {
         value.data = at;
         at += Aligned(value.length);
     }
-}
-
-Status FileFailed(const char* words) {
-    const bool full = errno == ENOSPC || errno == EDQUOT || errno == EFBIG;
-    return Error(full ? errors::kNoRoom : errors::kInputOutputError, words);
-}
-
-// A transfer that is cut short goes on; `move` answers like pwrite.
-template <class Move>
-bool All(std::size_t size, Move move) {
-    for (std::size_t done = 0; done < size;) {
-        const ssize_t moved = move(done);
-        if (moved <= 0) {
-            if (moved < 0 && errno == EINTR) continue;
-            return false;
-        }
-        done += static_cast<std::size_t>(moved);
-    }
-    return true;
 }
 
 }  // namespace
@@ -124,10 +103,8 @@ Status RowStore::Spill(Block& block) {
     if (!block.bytes) return {};
     Status status = OpenFile();
     if (status.Failed()) return status;
-    const bool written = All(block.room, [&](std::size_t done) {
-        return ::pwrite(file_, block.bytes.get() + done, block.room - done, static_cast<off_t>(file_size_ + done));
-    });
-    if (!written) return FileFailed("a temporary file cannot be written");
+    status = WriteTemporaryFile(file_, file_size_, {block.bytes.get(), block.room});
+    if (status.Failed()) return status;
     block.file_offset = file_size_;
     file_size_ += block.room;
     in_memory_ -= block.room;
@@ -144,12 +121,8 @@ Status RowStore::Load(std::size_t index, const std::byte*& bytes) {
             loaded_.bytes = std::make_unique_for_overwrite<std::byte[]>(block.room);
             loaded_.room = block.room;
         }
-        const bool read = All(block.room, [&](std::size_t done) {
-            errno = 0;
-            return ::pread(file_, loaded_.bytes.get() + done, block.room - done,
-                           static_cast<off_t>(block.file_offset + done));
-        });
-        if (!read) return FileFailed("a temporary file cannot be read");
+        Status status = ReadTemporaryFile(file_, block.file_offset, {loaded_.bytes.get(), block.room});
+        if (status.Failed()) return status;
         loaded_.index = index;
     }
     bytes = loaded_.bytes.get();
