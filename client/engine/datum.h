@@ -21,7 +21,7 @@ enum class Kind : std::uint8_t {
     text,       // UTF-8, `length` bytes at `data`; also what lies in a typed column without being of its type
     bytes,      // `length` bytes at `data`
     timestamp,  // date, time, fraction, zone: a date::DateTime at `data`; dates arrive so, too
-    lob,        // a large object: its locator, `length` bytes at `data` (lobs.h)
+    lob,        // a large object: its locator, `length` bytes at `data`; going in the object itself (lobs.h)
     row_id,     // a RowId at `data`
     cursor      // a result set: what Connection::OpenCursor takes, `length` bytes at `data`
 };

@@ -24,6 +24,8 @@ namespace engine {
 
 enum class LobKind : std::uint8_t { characters, bytes };    // characters are UTF-8
 constexpr std::byte FillerOf(LobKind kind) { return kind == LobKind::characters ? std::byte{' '} : std::byte{}; }
+// Values of no more bytes may be held in memory as one; longer ones go in pieces.
+constexpr std::uint64_t kHeldWhole = std::uint64_t{8} << 20;
 
 class Lob {
 public:
@@ -54,6 +56,9 @@ public:
     virtual Status CreateTemporary(LobKind kind, std::shared_ptr<Lob>& lob) = 0;
     // Of a value of Kind::lob, while its views hold. `brief`: it is let go before they end, and nothing need be kept.
     virtual Status Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob) = 0;
+    // Whether a placeholder's value may be a Datum of Kind::lob with a Lob at `data`, which is read while its row runs:
+    // one of more than kHeldWhole bytes, of the placeholder's kind.
+    [[nodiscard]] virtual bool TakesObjects() const { return false; }
 };
 
 // Makes `to` hold what `from` does from there on: `bytes` of it, or as many as there are.
