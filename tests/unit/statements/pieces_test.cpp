@@ -273,7 +273,6 @@ TEST_F(PieceByPiece, NullsAreToldThroughTheDefine) {
     EXPECT_EQ(Answer(rc), 1405) << "there is no indicator at all";
 }
 
-// A buffer that takes no character is refused with 24307, and the value stays whole for the next.
 // Rows that an execute delivers go into the elements from its offset on, whether values come in pieces or not.
 TEST_F(PieceByPiece, AnExecuteDeliversFromItsOffset) {
     ASSERT_EQ(Prepare("select 7, 'ab' from dual union all select 8, 'cd' from dual"), 0);
@@ -296,6 +295,7 @@ TEST_F(PieceByPiece, AnExecuteDeliversFromItsOffset) {
     EXPECT_EQ(numbers[2], 8);
 }
 
+// A buffer that takes no character is refused with 24307, and the value stays whole for the next.
 TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
     const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {
         {"\xc3\xa4z", SQLT_CHR, 1, 2, "\xc3\xa4"}, {"\xe2\x82\xacz", SQLT_CHR, 2, 3, "\xe2\x82\xac"},
