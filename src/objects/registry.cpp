@@ -136,6 +136,13 @@ NamedObject* FindByPointer(Kind kind, const void* object) {
     return nullptr;
 }
 
+NamedObject* FindNewestByPointer(Kind kind, const void* object) {
+    NamedObject* newest = nullptr;
+    for (NamedObject& slot : SlotsOf(kind))
+        if (slot.in_use && slot.object == object && (newest == nullptr || slot.turn > newest->turn)) newest = &slot;
+    return newest;
+}
+
 DescriptorReference ResolveDescriptor(Kind kind, const char* word) {
     if (IsInvalid(word)) return {.object = InvalidObject()};
     const DescriptorReference found = LookUp(kind, word);
@@ -185,11 +192,13 @@ bool MayBeName(const char* name) {
 }
 
 NamedObject* Register(Kind kind, const char* name, void* object, void* parent) {
+    static uint32_t turn = 0;
     if (!MayBeName(name)) return nullptr;
     for (NamedObject& slot : SlotsOf(kind)) {
         if (slot.in_use) continue;
         kTables[static_cast<size_t>(kind)].clear(slot);
         slot.in_use = true;
+        slot.turn = ++turn;
         slot.object = object;
         slot.parent = parent;
         std::strncpy(slot.name, name, static_cast<size_t>(InfoOf(kind).name_width) - 1);

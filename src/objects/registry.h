@@ -30,6 +30,7 @@ const KindInfo& InfoOf(Kind kind);
 
 struct NamedObject {
     bool in_use = false;     // release clears this and nothing else
+    uint32_t turn = 0;       // later ones were registered later
     void* parent = nullptr;  // the environment it was made from
     void* object = nullptr;  // the library's pointer; of an array of descriptors, the array
     char name[36] = {};
@@ -145,6 +146,8 @@ bool FindObject(Kind kind, const char* name, void*& object);
 NamedObject* FindByName(Kind kind, const char* name);
 // The first occupied slot of that pointer, or null.
 NamedObject* FindByPointer(Kind kind, const void* object);
+// The last one registered: libraries give the memory of a handle that went with its statement to the next one.
+NamedObject* FindNewestByPointer(Kind kind, const void* object);
 
 // --- Making and freeing --------------------------------------------------------------------------------------------
 

@@ -206,7 +206,7 @@ struct PieceInfo {
 };
 
 const char* NameOf(Kind kind, const void* handle) {
-    const NamedObject* const slot = FindByPointer(kind, handle);
+    const NamedObject* const slot = FindNewestByPointer(kind, handle);
     return slot == nullptr ? "unknown" : slot->name;
 }
 
