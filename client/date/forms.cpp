@@ -108,6 +108,28 @@ bool ReadDateAfterYear(Reader& reader, DateTime* value) {
     return (reader.Take(' ') || reader.Take('T')) && reader.SmallNumber(&value->hour) && ReadTime(reader, value);
 }
 
+// "YYYY-MM-DD", with " HH:MM:SS" behind it or not, at once: nearly all dates in tables are written so. Changes the value
+// for no other text. What it reads is not validated.
+bool ReadPlain(std::string_view text, DateTime* value) {
+    constexpr std::size_t kDate = 10, kWithTime = 19;
+    const bool has_time = text.size() == kWithTime;
+    if (!has_time && text.size() != kDate) return false;
+    bool fits = text[4] == '-' && text[7] == '-' && (!has_time || (text[10] == ' ' && text[13] == ':' && text[16] == ':'));
+    const auto two = [&](std::size_t at) {
+        const auto tens = static_cast<unsigned>(text[at] - '0'), ones = static_cast<unsigned>(text[at + 1] - '0');
+        fits &= tens <= 9 && ones <= 9;
+        return static_cast<std::uint8_t>(tens * 10 + ones);
+    };
+    DateTime read;
+    read.year = static_cast<std::int16_t>(two(0) * 100);
+    read.year = static_cast<std::int16_t>(read.year + two(2));
+    read.month = two(5);
+    read.day = two(8);
+    if (has_time) read.hour = two(11), read.minute = two(14), read.second = two(17);
+    if (fits) *value = read;
+    return fits;
+}
+
 }  // namespace
 
 DateTime FromOciDate(const OCIDate& value) noexcept {
@@ -172,6 +194,12 @@ std::size_t ToEngineText(const DateTime& value, char* text) noexcept {
 }
 
 Errno FromEngineText(std::string_view text, DateTime* result) noexcept {
+    DateTime value;
+    if (ReadPlain(text, &value)) {
+        if (const Errno number = Validate(value)) return number;
+        *result = value;
+        return 0;
+    }
     constexpr std::string_view kBeforeChrist = " BC";
     const bool named_era = text.ends_with(kBeforeChrist);
     if (named_era) text.remove_suffix(kBeforeChrist.size());
@@ -180,7 +208,6 @@ Errno FromEngineText(std::string_view text, DateTime* result) noexcept {
     int first = 0;
     if (!reader.Number(6, &first)) return errors::kTextMismatch;
     if (first > kMaxYear) return errors::kBadYear;
-    DateTime value;
     if (reader.Take('-')) {
         value.year = static_cast<std::int16_t>(before_christ ? -first : first);
         if (!ReadDateAfterYear(reader, &value)) return errors::kTextMismatch;

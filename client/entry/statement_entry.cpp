@@ -72,7 +72,7 @@ sword SetPiece(dvoid* object, OCIError* err, const PieceBuffer& piece, const cha
         const SerialLock lock(*statement);
         // Without a session there is no lock, and nothing that could wait for a piece.
         const bool locked = !statement->Env().Threaded() || statement->Serial();
-        return locked ? statement->SetPieceInfo(*handle.area, piece) : Error(errors::kIllegalOperation);
+        return locked ? statement->SetPlace(*handle.area, piece) : Error(errors::kIllegalOperation);
     }, name);
 }
 
@@ -109,7 +109,7 @@ sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub
     });
 }
 
-sword OCIStmtFetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, ub4 mode) {
+[[gnu::flatten]] sword OCIStmtFetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, ub4 mode) {
     return Fetch(stmt, err, rows, orientation, 0, mode);
 }
 
@@ -150,16 +150,15 @@ sword OCIStmtGetNextResult(OCIStmt* stmt, OCIError* err, dvoid** result, ub4* rt
 sword OCIStmtGetPieceInfo(OCIStmt* stmt, OCIError* err, dvoid** hndl, ub4* type, ub1* inOut, ub4* iter, ub4* idx,
                           ub1* piece) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
-        Statement::PieceInfo info;
-        Status status = statement.GetPieceInfo(info);
-        if (!status.Ok()) return status;
-        if (hndl) *hndl = info.handle;
-        if (type) *type = info.type;
-        if (inOut) *inOut = info.direction;
-        if (iter) *iter = info.iteration;
-        if (idx) *idx = info.index;
-        if (piece) *piece = info.piece;
-        return status;
+        const WantedPiece* const wanted = statement.Wanted();
+        if (!wanted) return Error(errors::kIllegalOperation);
+        if (hndl) *hndl = wanted->area->Pointer();
+        if (type) *type = wanted->area->HandleType();
+        if (inOut) *inOut = wanted->out ? OCI_PARAM_OUT : OCI_PARAM_IN;
+        if (iter) *iter = wanted->iteration;
+        if (idx) *idx = wanted->index;
+        if (piece) *piece = wanted->continued ? OCI_NEXT_PIECE : OCI_ONE_PIECE;
+        return Status();
     });
 }
 

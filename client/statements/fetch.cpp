@@ -1,4 +1,7 @@
-// Statements: fetching rows into the defines.
+// Statements: fetching rows into the defines, and values in pieces: such a fetch ends with OCI_NEED_DATA where it waits
+// for the application, and goes on with the next call.
+#include <algorithm>
+
 #include "handles/errors.h"
 #include "sessions/link.h"
 #include "statements/fetch_sink.h"
@@ -17,7 +20,7 @@ Status Statement::CheckFetch() {
 }
 
 // What the engine had to say waits for the end of a fetch that goes on.
-Status Statement::Fetch(ErrorHandle& error, ub4 rows, ub2 orientation, sb4 offset) {
+[[gnu::flatten]] Status Statement::Fetch(ErrorHandle& error, ub4 rows, ub2 orientation, sb4 offset) {
     const PieceStream::Use wants = pieces_.Wants();
     const bool goes_on = wants == PieceStream::Use::fetch || wants == PieceStream::Use::fetch_by_execute;
     Status status = goes_on ? ContinueFetch() : FetchNow(rows, orientation, offset);
@@ -73,8 +76,11 @@ Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> v
     if (error != 0 && error != errors::kTruncationWarning) return Error(error);
     if (error != 0) warning_ = Warning(error);
     if (in_pieces_) {
-        if (Status status = ReadLobs(values); !status.Ok()) return status;
-        statement_.pieces_.Begin(index_, row_);
+        const bool has_lobs =
+            std::any_of(values.begin(), values.end(), [](const auto& value) { return value.kind == engine::Kind::lob; });
+        if (has_lobs)
+            if (Status status = ReadLobs(values); !status.Ok()) return status;
+        statement_.pieces_.Begin(index_, has_lobs ? std::span<const engine::Datum>(row_) : values);
     } else {
         ++statement_.run_.rows_fetched;
     }
@@ -114,4 +120,45 @@ Status Statement::EndOfFetch() {
     run_.row_count = run_.cursor.Reached();
     run_.state = Execution::State::end_of_fetch;
     return NoData();
+}
+
+// ---- In pieces
+
+// `rows` rows into the elements from `first` on. `execute`: what the execute that delivers them was asked for, or null.
+Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position,
+                                     const ExecuteArguments* execute) {
+    pieces_.StartFetch(first + rows, execute != nullptr, execute ? execute->mode : ub4{OCI_DEFAULT});
+    Status status = NextRowInPieces(first, position);
+    return status.Ok() ? ContinueFetch() : status;
+}
+
+// Ok when the row is there. The defines are active.
+Status Statement::NextRowInPieces(ub4 row, const std::uint64_t* position) {
+    FetchSink sink(*this, row, true);
+    std::uint32_t delivered = 0;
+    Status status = position ? run_.cursor.ReadFrom(*position, sink, 1, delivered) : run_.cursor.Read(sink, 1, delivered);
+    if (status.Ok() && delivered == 0) status = EndOfFetch();
+    if (!sink.Warned().Ok()) pieces_.Warn();
+    if (!status.Ok()) pieces_.End();
+    return status;
+}
+
+// A row counts when all its pieces are taken.
+Status Statement::ContinueFetch() {
+    Status status = pieces_.HandOut(defines_, driver_);
+    while (status.Ok()) {
+        ++run_.rows_fetched;
+        run_.row_count = run_.cursor.Reached();
+        const ub4 next = pieces_.Row() + 1;
+        if (next == pieces_.EndRow()) {
+            pieces_.End();
+            break;
+        }
+        status = defines_.Activate(run_.cursor.Columns(), UsedLink()->lobs);
+        if (!status.Ok()) pieces_.End();
+        if (status.Ok()) status = NextRowInPieces(next, nullptr);
+        if (status.Ok()) status = pieces_.HandOut(defines_, driver_);
+    }
+    if (status.Ok() && pieces_.Warned()) return Warning(errors::kTruncationWarning);
+    return status;
 }

@@ -1,7 +1,6 @@
 #include "statements/piece_drivers.h"
 
 #include <cstring>
-#include <utility>
 
 #include "handles/errors.h"
 
@@ -11,8 +10,7 @@ bool SaysNull(const PieceBuffer& piece) {
     return indicator == values::kNullIndicator;
 }
 
-Status PollingDriver::Supply(WantedPiece& wanted) {
-    if (std::exchange(wanted.area->piece.is_set, false)) return {};
+Status Poll(WantedPiece& wanted) {
     if (wanted.asked) return Error(errors::kNoBuffer);
     wanted.asked = true;
     return NeedData(wanted.out ? errors::kWantsBuffer : errors::kWantsPiece);
@@ -35,7 +33,6 @@ sb4 CallbackDriver::Call(const WantedPiece& wanted, PieceBuffer& place) {
 }
 
 Status CallbackDriver::Supply(WantedPiece& wanted) {
-    if (!wanted.ByCallback()) return polling_.Supply(wanted);
     DataArea& area = *wanted.area;
     PieceBuffer place;
     place.piece = wanted.continued ? OCI_NEXT_PIECE : OCI_ONE_PIECE;

@@ -3,6 +3,8 @@
 // Threads: under the statement's serial lock, callbacks included.
 #pragma once
 
+#include <utility>
+
 #include "statements/data_area.h"
 
 // The piece that is wanted next.
@@ -15,32 +17,23 @@ struct WantedPiece {
     bool asked = false;       // the application knows
 
     [[nodiscard]] bool ByCallback() const { return area->AsksBy().Serve(out); }
+    // By polling: takes the place that OCIStmtSetPieceInfo put into the area, once. False when it gave none.
+    [[nodiscard]] bool TakePlace() const { return std::exchange(area->piece.is_set, false); }
 };
 
-class PieceDriver {
-public:
-    virtual ~PieceDriver() = default;
-    // Puts the place of the piece into its area. What is not Ok ends the call that is under way.
-    virtual Status Supply(WantedPiece& wanted) = 0;
-};
+// What a call answers that has no place for a polled piece: OCI_NEED_DATA until it is made again. The piece stays
+// wanted.
+Status Poll(WantedPiece& wanted);
 
-// Takes the places that OCIStmtSetPieceInfo gave, and waits for them: OCI_NEED_DATA until the call is made again. The
-// piece stays wanted.
-class PollingDriver final : public PieceDriver {
+// Calls the application.
+class CallbackDriver {
 public:
-    Status Supply(WantedPiece& wanted) override;
-};
-
-// Calls the application; polls where it registered nothing to call. 24343 when a callback answers anything but
-// OCI_CONTINUE.
-class CallbackDriver final : public PieceDriver {
-public:
-    Status Supply(WantedPiece& wanted) override;
+    // Puts the place of the piece into its area. 24343 when the callback answers anything but OCI_CONTINUE.
+    Status Supply(WantedPiece& wanted);
 
 private:
     sb4 Call(const WantedPiece& wanted, PieceBuffer& place);
 
-    PollingDriver polling_;
     ub4 length_ = 0;    // that a callback told by value
 };
 

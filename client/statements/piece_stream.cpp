@@ -56,10 +56,10 @@ void OwnRow::Keep(std::span<const engine::Datum> values) {
     const auto words = [](const engine::Datum& value) {
         return value.kind > engine::Kind::real ? (value.length + kWord - 1) / kWord : 0;
     };
-    std::size_t total = 0;
+    std::size_t total = 1;    // no view is null
     for (const engine::Datum& value : values) total += words(value);
     values_.assign(values.begin(), values.end());
-    bytes_.resize(std::max<std::size_t>(total, 1));
+    if (bytes_.size() < total) bytes_.resize(total);
     std::uint64_t* at = bytes_.data();
     for (engine::Datum& value : values_) {
         if (value.kind <= engine::Kind::real) continue;
@@ -105,10 +105,15 @@ Status PieceStream::SetPlace(DataArea& area, const PieceBuffer& place) {
     return {};
 }
 
-// Has the driver put the place of the piece into its area. A polled piece stays wanted whatever is answered; the failure
-// of a callback ends the operation. No area is wanted any more when its handle was freed while its value came out.
-Status PieceStream::Ask(PieceDriver& driver) {
-    if (!wanted_.ByCallback()) return driver.Supply(wanted_);
+// Ok when the place of the piece is in its area. A polled piece stays wanted whatever is answered.
+inline Status PieceStream::Place(CallbackDriver& driver) {
+    if (wanted_.ByCallback()) return Ask(driver);
+    return wanted_.TakePlace() ? Status() : Poll(wanted_);
+}
+
+// Has a callback put it there; its failure ends the operation. No area is wanted any more when its handle was freed
+// while its value came out.
+Status PieceStream::Ask(CallbackDriver& driver) {
     Status status;
     {
         struct Asking {
@@ -193,7 +198,7 @@ void PieceStream::ForgetReturned() noexcept {
     for (const auto& bind : outs_) bind->out.clear();
 }
 
-Status PieceStream::Collect(PieceDriver& driver) {
+Status PieceStream::Collect(CallbackDriver& driver) {
     for (; bind_ < ins_.size(); ++bind_) {
         BindArea& bind = *ins_[bind_];
         const ub4 elements = ElementsOf(bind);
@@ -207,10 +212,10 @@ Status PieceStream::Collect(PieceDriver& driver) {
     return {};
 }
 
-Status PieceStream::CollectPiece(BindArea& bind, PieceDriver& driver) {
+Status PieceStream::CollectPiece(BindArea& bind, CallbackDriver& driver) {
     wanted_.area = &bind;
     const bool by_callback = wanted_.ByCallback();
-    if (Status status = Ask(driver); !status.Ok()) return status;
+    if (Status status = Place(driver); !status.Ok()) return status;
     if (const int error = AppendPiece(bind.in[wanted_.index], bind.piece, by_callback)) return Fail(error);
     wanted_.asked = false;
     if (!wanted_.continued) ++wanted_.index;
@@ -287,7 +292,7 @@ bool PieceStream::ReturnsToCallbacks() const noexcept {
            std::all_of(outs_.begin(), outs_.end(), [](const auto& bind) { return bind->AsksBy().out != nullptr; });
 }
 
-Status PieceStream::Deliver(PieceDriver& driver) {
+Status PieceStream::Deliver(CallbackDriver& driver) {
     while (wanted_.area || NextReturned())
         if (Status status = HandPieces(driver); !status.Ok()) return status;
     return {};
@@ -315,16 +320,16 @@ int PieceStream::NextValue(const Defines& defines) {
     const std::uint64_t erased = live::erased_objects.load(std::memory_order_acquire);
     const bool all_live = erased == defines.Seen();
     const auto takes_part = [&](const DataArea& area) { return area.InPieces() && (all_live || area.HasHandle()); };
-    while (define_ < all.size() && !takes_part(*all[define_].area)) ++define_;
-    if (define_ == all.size()) return 0;
-    const Defines::Active& active = all[define_];
-    DataArea& area = *active.area;
-    const engine::Datum& value = row_[active.column];
+    auto active = all.begin() + static_cast<std::ptrdiff_t>(define_);
+    for (; active != all.end() && !takes_part(*active->area); ++active) ++define_;
+    if (active == all.end()) return 0;
+    DataArea& area = *active->area;
+    const engine::Datum& value = row_[active->column];
     is_null_ = value.kind == engine::Kind::null;
     rest_ = {};
     int error = 0;
-    if (!is_null_) error = active.renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, rest_);
-    if (error == 0 && area.Type()->family == values::Family::text)
+    if (!is_null_) error = active->renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, rest_);
+    if (error == 0 && area.workspace.set && area.Type()->family == values::Family::text)
         error = values::ToApplication(rest_, area.workspace, rest_);
     if (error != 0) return error;
     ++define_;    // memory that is short leaves the value to the next call
@@ -369,10 +374,10 @@ int PieceStream::EndCut(const PieceBuffer& place) {
 }
 
 // The value at hand, until it is taken.
-Status PieceStream::HandPieces(PieceDriver& driver) {
+Status PieceStream::HandPieces(CallbackDriver& driver) {
     while (wanted_.area) {
         const bool by_callback = wanted_.ByCallback();
-        if (Status status = Ask(driver); !status.Ok()) return status;
+        if (Status status = Place(driver); !status.Ok()) return status;
         if (!wanted_.area) break;
         bool value_ends = false;
         if (const int error = TakePiece(value_ends)) {
@@ -386,7 +391,7 @@ Status PieceStream::HandPieces(PieceDriver& driver) {
     return {};
 }
 
-Status PieceStream::HandOut(const Defines& defines, PieceDriver& driver) {
+[[gnu::flatten]] Status PieceStream::HandOut(const Defines& defines, CallbackDriver& driver) {
     for (;;) {
         if (!wanted_.area) {
             if (const int error = NextValue(defines)) return Fail(error);

@@ -60,13 +60,13 @@ public:
     // missing beside one that is there.
     Status StartExecute(const BoundText& text, const ExecuteArguments& arguments);
     // Ok when all values of the iteration are there.
-    Status Collect(PieceDriver& driver);
+    Status Collect(CallbackDriver& driver);
     // What the iteration gave the targets, or, of a block, what its variables hold.
     void StartDelivery(bool is_block);
     void ForgetReturned() noexcept;    // the iteration failed
     [[nodiscard]] bool ReturnsToCallbacks() const noexcept;    // all that comes back
     [[nodiscard]] bool Delivers() const { return wanted_.out; }
-    Status Deliver(PieceDriver& driver);
+    Status Deliver(CallbackDriver& driver);
     void NextIteration() noexcept;
     [[nodiscard]] const ExecuteArguments& Arguments() const { return arguments_; }
 
@@ -74,7 +74,7 @@ public:
     void StartFetch(ub4 end, bool by_execute, ub4 mode) noexcept;
     void Begin(ub4 row, std::span<const engine::Datum> values);
     // Ok when the row is taken; its defines are those of `defines`.
-    Status HandOut(const Defines& defines, PieceDriver& driver);
+    Status HandOut(const Defines& defines, CallbackDriver& driver);
     [[nodiscard]] ub4 Row() const { return wanted_.iteration; }
     [[nodiscard]] ub4 EndRow() const { return arguments_.iterations; }
 
@@ -86,11 +86,12 @@ private:
     void EndUnlessLiving() noexcept;
     [[nodiscard]] bool AllLiving() const noexcept;
     Status Fail(int error) noexcept;
-    Status Ask(PieceDriver& driver);
+    Status Place(CallbackDriver& driver);
+    Status Ask(CallbackDriver& driver);
     void ForgetValues() noexcept;
-    Status CollectPiece(BindArea& bind, PieceDriver& driver);
+    Status CollectPiece(BindArea& bind, CallbackDriver& driver);
     bool NextReturned();
-    Status HandPieces(PieceDriver& driver);
+    Status HandPieces(CallbackDriver& driver);
     // These answer an error's number or 0.
     int AppendPiece(WholeValue& whole, const PieceBuffer& place, bool by_callback);
     int NextValue(const Defines& defines);

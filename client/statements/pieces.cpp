@@ -1,72 +1,12 @@
-// Statements: executes and fetches whose values go in pieces. They end with OCI_NEED_DATA where the driver waits for the
-// application, and go on with the next call of the same function.
+// Statements: executes whose values go in pieces. They end with OCI_NEED_DATA where they wait for the application, and
+// go on with the next call of the same function.
 #include <exception>
 #include <memory>
 #include <utility>
 
 #include "handles/errors.h"
-#include "statements/fetch_sink.h"
-
-// ---- What is wanted
-
-Status Statement::GetPieceInfo(PieceInfo& info) {
-    if (pieces_.Wants() == PieceStream::Use::none) return Error(errors::kIllegalOperation);
-    const WantedPiece& wanted = pieces_.Wanted();
-    info = {wanted.area->Pointer(),
-            wanted.area->HandleType(),
-            static_cast<ub1>(wanted.out ? OCI_PARAM_OUT : OCI_PARAM_IN),
-            wanted.iteration,
-            wanted.index,
-            static_cast<ub1>(wanted.continued ? OCI_NEXT_PIECE : OCI_ONE_PIECE)};
-    return {};
-}
-
-Status Statement::SetPieceInfo(DataArea& area, const PieceBuffer& piece) { return pieces_.SetPlace(area, piece); }
-
-// ---- Fetching
-
-// `rows` rows into the elements from `first` on. `execute`: what the execute that delivers them was asked for, or null.
-Status Statement::StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position,
-                                     const ExecuteArguments* execute) {
-    pieces_.StartFetch(first + rows, execute != nullptr, execute ? execute->mode : ub4{OCI_DEFAULT});
-    Status status = NextRowInPieces(first, position);
-    return status.Ok() ? ContinueFetch() : status;
-}
-
-// Ok when the row is there.
-Status Statement::NextRowInPieces(ub4 row, const std::uint64_t* position) {
-    if (Status status = defines_.Activate(run_.cursor.Columns(), UsedLink()->lobs); !status.Ok()) {
-        pieces_.End();
-        return status;
-    }
-    FetchSink sink(*this, row, true);
-    std::uint32_t delivered = 0;
-    Status status = position ? run_.cursor.ReadFrom(*position, sink, 1, delivered) : run_.cursor.Read(sink, 1, delivered);
-    if (status.Ok() && delivered == 0) status = EndOfFetch();
-    if (!sink.Warned().Ok()) pieces_.Warn();
-    if (!status.Ok()) pieces_.End();
-    return status;
-}
-
-// A row counts when all its pieces are taken.
-Status Statement::ContinueFetch() {
-    Status status = pieces_.HandOut(defines_, driver_);
-    while (status.Ok()) {
-        ++run_.rows_fetched;
-        run_.row_count = run_.cursor.Reached();
-        const ub4 next = pieces_.Row() + 1;
-        if (next == pieces_.EndRow()) {
-            pieces_.End();
-            break;
-        }
-        status = NextRowInPieces(next, nullptr);
-        if (status.Ok()) status = pieces_.HandOut(defines_, driver_);
-    }
-    if (status.Ok() && pieces_.Warned()) return Warning(errors::kTruncationWarning);
-    return status;
-}
-
-// ---- Executing
+#include "sessions/link.h"
+#include "statements/statement.h"
 
 namespace {
 

@@ -73,18 +73,11 @@ public:
     void CollectResultTargets(const ExecuteArguments& arguments, std::vector<Statement*>& targets) const;
     Status GetParameter(ub4 position, dvoid** out);
 
-    // Pieces.
-    struct PieceInfo {
-        dvoid* handle;
-        ub4 type;
-        ub1 direction;
-        ub4 iteration;
-        ub4 index;
-        ub1 piece;
-    };
-    Status GetPieceInfo(PieceInfo& info);
-    // The area must be that of the handle that GetPieceInfo names.
-    Status SetPieceInfo(DataArea& area, const PieceBuffer& piece);
+    // Pieces: the one that is wanted next, or null; and its place, which must be that of the wanted piece's handle.
+    [[nodiscard]] const WantedPiece* Wanted() noexcept {
+        return pieces_.Wants() == PieceStream::Use::none ? nullptr : &pieces_.Wanted();
+    }
+    Status SetPlace(DataArea& area, const PieceBuffer& place) { return pieces_.SetPlace(area, place); }
 
     // The statement cache (statement_cache.h): whether prepare2 made the handle; the cache that keeps it, or null, and
     // the key it is kept under.
@@ -170,11 +163,11 @@ private:
     Status FindFirst(ub2 orientation, sb4 offset, std::uint64_t& position);
     Status FetchRows(ub4 rows, ub4 first, const std::uint64_t* position);
     Status EndOfFetch();
-
-    // pieces.cpp
     Status StartFetchInPieces(ub4 rows, ub4 first, const std::uint64_t* position, const ExecuteArguments* execute);
     Status NextRowInPieces(ub4 row, const std::uint64_t* position);
     Status ContinueFetch();
+
+    // pieces.cpp
     Status StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments);
     Status ContinueExecute(ErrorHandle& error);
     Status RunCollected(bool& stopped);
