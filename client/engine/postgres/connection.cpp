@@ -6,7 +6,9 @@
 #include <new>
 #include <utility>
 
+#include "engine/postgres/lob_store.h"
 #include "engine/postgres/query.h"
+#include "engine/postgres/types.h"
 #include "handles/errors.h"
 
 namespace engine::postgres {
@@ -29,7 +31,7 @@ struct MarkText {
 }  // namespace
 
 PgConnection::PgConnection(std::shared_ptr<Home> home, Credentials credentials, std::unique_ptr<class Wire> wire)
-    : home_(std::move(home)), credentials_(std::move(credentials)), wire_(std::move(wire)) {
+    : home_(std::move(home)), credentials_(std::move(credentials)), wire_(std::move(wire)), lobs_(std::make_unique<PgLobStore>(*this)) {
     wire_->notices = &notices_;
 }
 
@@ -53,15 +55,23 @@ Status PgConnection::Enter() {
 }
 
 Status PgConnection::Enter(Effect effect) {
-    if (effect != Effect::defines) return Enter();
-    not_null_.clear();
-    if (Status status = Commit(); status.Failed()) return status;
-    return Enter();
+    if (Status status = Enter(); !status.Ok()) return status;
+    if (effect == Effect::defines) {
+        tables_.clear();
+        if (Status status = Commit(); status.Failed()) return status;
+    }
+    if (Status status = lobs_->Settle(); status.Failed()) return status;
+    lobs_->StatementRuns();
+    return {};
 }
+
+LobStore* PgConnection::Lobs() { return lobs_.get(); }
 
 void PgConnection::Note() noexcept {
     const PGTransactionStatusType state = wire_->Transaction();
-    in_transaction_ = !wire_->Broken() && (state == PQTRANS_INTRANS || state == PQTRANS_INERROR);
+    const bool before = std::exchange(in_transaction_, !wire_->Broken() && (state == PQTRANS_INTRANS || state == PQTRANS_INERROR));
+    if (!before && in_transaction_) lobs_->TransactionBegins();
+    if (before && !in_transaction_) lobs_->Forget();
     if (!in_transaction_) savepoints_.clear();
 }
 
@@ -97,6 +107,7 @@ Status PgConnection::Settle(Guard guard, Status status) noexcept {
         wire_->Send(kDropGuard);
         wire_->Sync();
         const Status undone = wire_->Drain();
+        lobs_->Undone();
         Note();
         return undone.Ok() ? status : Lose(status);
     }
@@ -150,21 +161,77 @@ Status PgConnection::Ask(const char* sql, const std::vector<std::string>& values
     return status.Ok() || !in_transaction_ ? status : Lose(status);
 }
 
-Status PgConnection::NotNull(Oid table, std::vector<bool>& columns) {
-    if (const auto known = not_null_.find(table); known != not_null_.end()) {
-        columns = known->second;
+Status PgConnection::AskGuarded(const std::string& sql, const Wire::Values& values, Result& result) {
+    if (Status status = Enter(); !status.Ok()) return status;
+    const Guard guard = SendGuard(false);
+    wire_->SendQuery(sql.c_str(), values, true);
+    SendRelease(guard);
+    Status status = PassGuard(guard);
+    while (status.Ok()) {
+        Result next = wire_->Next();
+        if (!next) break;
+        if (PQresultStatus(next.get()) == PGRES_FATAL_ERROR) status = wire_->Answer(next.get());
+        else result = std::move(next);
+    }
+    Status rest = wire_->Drain();
+    return Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+}
+
+Status PgConnection::ReadTable(Oid table, Table& read) {
+    const std::string number = std::to_string(table);
+    Result result;
+    Status status = AskGuarded(
+        "select a.attnum::text, pg_catalog.format('%I', a.attname), a.attname, a.attnotnull::text, a.atttypmod::text,"
+        " case when t.typtype = 'd' then t.typbasetype else t.oid end::text,"
+        " case when t.typnamespace = pg_catalog.to_regnamespace('kelp') then t.typname else '' end,"
+        " pg_catalog.format('%I.%I', n.nspname, c.relname), c.relkind::text from pg_catalog.pg_class c"
+        " join pg_catalog.pg_namespace n on n.oid = c.relnamespace join pg_catalog.pg_attribute a on a.attrelid = c.oid"
+        " join pg_catalog.pg_type t on t.oid = a.atttypid"
+        " where c.oid = $1::oid and a.attnum > 0 and not a.attisdropped order by a.attnum",
+        {{number.c_str()}, {0}, {0}}, result);
+    for (int row = 0; status.Ok() && row < PQntuples(result.get()); ++row) {
+        const auto text = [&](int column) { return PQgetvalue(result.get(), row, column); };
+        const auto place = static_cast<std::size_t>(std::atoi(text(0)));
+        read.columns.resize(place + 1);
+        TableColumn& column = read.columns[place];
+        column.name = text(1);
+        column.domain = text(6);
+        DescribeColumn(static_cast<Oid>(std::strtoul(text(5), nullptr, 10)), std::atoi(text(4)), column.domain, column.described);
+        column.described.name = ShownName(text(2));
+        column.described.nullable = *text(3) == 'f';
+        read.name = text(7);
+        read.has_rows = *text(8) == 'r';
+    }
+    return status;
+}
+
+Status PgConnection::TableOf(Oid table, std::shared_ptr<const Table>& known) {
+    if (const auto found = tables_.find(table); found != tables_.end()) {
+        known = found->second;
         return {};
     }
-    Result result;
-    Status status = Ask("select attnum from pg_catalog.pg_attribute where attrelid = $1::oid and attnotnull and attnum > 0",
-                        {std::to_string(table)}, result);
-    for (int row = 0; status.Ok() && row < PQntuples(result.get()); ++row) {
-        const auto place = static_cast<std::size_t>(std::stoul(PQgetvalue(result.get(), row, 0)));
-        if (columns.size() <= place) columns.resize(place + 1);
-        columns[place] = true;
+    auto made = std::make_shared<Table>();
+    if (Status status = ReadTable(table, *made); !status.Ok()) return status;
+    known = tables_[table] = std::move(made);
+    return {};
+}
+
+Status PgConnection::BaseType(Oid& type) {
+    constexpr Oid kFirstMade = 16384;    // by users
+    if (type < kFirstMade) return {};
+    if (const auto known = base_types_.find(type); known != base_types_.end()) {
+        type = known->second;
+        return {};
     }
-    if (status.Ok()) not_null_[table] = columns;
-    return status;
+    const std::string number = std::to_string(type);
+    Result result;
+    Status status = AskGuarded("select typbasetype from pg_catalog.pg_type where oid = $1::oid and typtype = 'd'",
+                               {{number.c_str()}, {0}, {0}}, result);
+    if (!status.Ok()) return status;
+    const Oid base = PQntuples(result.get()) == 1 ? Get<std::uint32_t>(PQgetvalue(result.get(), 0, 0)) : type;
+    base_types_[type] = base;
+    type = base;
+    return {};
 }
 
 // ---- Transactions
@@ -183,6 +250,10 @@ Status PgConnection::Commit() {
     if (wire_->Broken()) return wire_->Lost();
     if (!in_transaction_) return {};
     if (Status status = Enter(); !status.Ok()) return status;
+    if (Status settled = lobs_->Settle(); settled.Failed()) {
+        if (settled.Number() == errors::kOutOfMemory && in_transaction_) return settled;    // nothing is lost
+        return Lose(settled);
+    }
     Status status = wire_->Run("commit");
     Note();
     const bool violated = status.Number() == 1 || status.Number() == errors::kParentMissing ||
@@ -194,6 +265,7 @@ Status PgConnection::Rollback() {
     if (wire_->Broken()) return wire_->Lost();
     if (!in_transaction_) return {};
     if (Status status = Enter(); !status.Ok()) return status;
+    lobs_->Forget();
     Status status = wire_->Run("rollback");
     Note();
     return status;
@@ -216,6 +288,7 @@ std::size_t PgConnection::LastMark() const noexcept {
 
 Status PgConnection::SetMark() {
     if (Status status = Enter(); !status.Ok()) return status;
+    if (Status status = lobs_->Settle(); status.Failed()) return status;
     savepoints_.reserve(savepoints_.size() + 1);
     const Guard guard = in_transaction_ ? Guard::none : Guard::began;
     if (guard == Guard::began) wire_->Send(kBegins[0]);
@@ -231,6 +304,7 @@ Status PgConnection::UndoToMark() {
     const std::size_t mark = LastMark();
     if (mark == savepoints_.size()) return Refused(errors::kNoSuchSavepoint);
     if (Status status = Enter(); !status.Ok()) return status;
+    lobs_->Forget();
     Status status = wire_->Run(MarkText("rollback to savepoint", savepoints_[mark].mark).text);
     Note();
     if (!status.Ok()) return Lose(status);

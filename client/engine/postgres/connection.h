@@ -18,7 +18,20 @@
 
 namespace engine::postgres {
 
+class PgLobStore;
 class PgQuery;
+
+// A table or view as it was when it was first asked for.
+struct TableColumn {
+    std::string name;       // as it stands in SQL; empty: there is none of that number
+    std::string domain;     // of its type, where that is one of the schema kelp
+    Column described;
+};
+struct Table {
+    std::string name;       // as it stands in SQL
+    bool has_rows = false;  // with places of their own
+    std::vector<TableColumn> columns;    // by number, from 1
+};
 
 class PgConnection final : public Connection {
 public:
@@ -45,7 +58,7 @@ public:
     Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { wire_->Obey(std::move(stop)); }
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
-    LobStore* Lobs() override { return nullptr; }
+    LobStore* Lobs() override;
     Status Ping() override;
     [[nodiscard]] bool Broken() const override { return wire_->Broken(); }
     void Interrupt() noexcept override { wire_->Wake(); }
@@ -54,8 +67,12 @@ public:
 
     [[nodiscard]] Wire& Server() { return *wire_; }
     [[nodiscard]] static Status Stopped();
-    // By table: its columns that take no null, as they were when first asked for.
-    Status NotNull(Oid table, std::vector<bool>& columns);
+    Status ReadTable(Oid table, Table& read);
+    // The same, remembered until this session defines something.
+    Status TableOf(Oid table, std::shared_ptr<const Table>& known);
+    // The type that a domain is of; any other type as it is.
+    Status BaseType(Oid& type);
+    [[nodiscard]] PgLobStore& Large() { return *lobs_; }
     // Makes way for something else: has the query whose rows still come read them ahead, and forgets what closed queries
     // have left with the server. 3114 on a broken connection.
     Status Enter();
@@ -85,6 +102,8 @@ public:
     Status CheckSavepoint(const SavepointCommand& command);
     void NoteSavepoint(const SavepointCommand& command);
 
+    void Note() noexcept;    // what the server says of the transaction
+
     // Names that prepared statements have on this connection, and the end of one.
     std::string NewName();
     void Forget(const std::string& name) noexcept;
@@ -95,12 +114,13 @@ public:
 
     // Rows of a question of the engine's own, with texts as values.
     Status Ask(const char* sql, const std::vector<std::string>& values, Result& result);
+    // The same, which undoes itself when it fails, as a statement of the application's does. Results are binary.
+    Status AskGuarded(const std::string& sql, const Wire::Values& values, Result& result);
 
 private:
     [[nodiscard]] std::size_t LastMark() const noexcept;    // its place; the count of savepoints: there is none
     Status Lose(const Status& failure) noexcept;
     Status FinishPrepared(const char* verb, const Xid& xid);
-    void Note() noexcept;    // what the server says of the transaction
 
     std::shared_ptr<Home> home_;
     Credentials credentials_;
@@ -114,7 +134,9 @@ private:
     unsigned marks_ = 0;
     std::vector<std::string> forgotten_;     // commands that end prepared statements which nobody has any more
     std::uint64_t names_ = 0;
-    std::map<Oid, std::vector<bool>> not_null_;
+    std::map<Oid, std::shared_ptr<const Table>> tables_;
+    std::map<Oid, Oid> base_types_;
+    std::unique_ptr<PgLobStore> lobs_;
     PgQuery* streaming_ = nullptr;
 };
 

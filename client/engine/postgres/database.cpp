@@ -25,13 +25,13 @@ constexpr Dialect::Spelling kTypes[] = {
     {"smallint", "numeric(38)"},
     {"decfloat", "numeric", true},
     {"float", "numeric", true},
-    {"long raw", "bytea"},
-    {"long", "text"},
-    {"raw", "bytea", true},
+    {"long raw", "kelp.long_raw"},
+    {"long", "kelp.long"},
+    {"raw", "kelp.raw", true},
     {"blob", "bytea"},
     {"clob", "text"},
-    {"nclob", "text"},
-    {"dbclob", "text"},
+    {"nclob", "kelp.nclob"},
+    {"dbclob", "kelp.dbclob"},
     {"date", "kelp.date"},
     {"rowid", "tid"},
     {"timestamp with local time zone", "timestamptz"},
@@ -117,9 +117,9 @@ const Dialect& PgDatabase::GetDialect() const {
 
 // Whether transactions can be prepared is a setting of the server's.
 const Capabilities& PgDatabase::GetCapabilities() const {
-    static constexpr Capabilities kOnePhase{.sequences = true, .typed_parameters = true};
+    static constexpr Capabilities kOnePhase{.lobs = true, .sequences = true, .typed_parameters = true};
     static constexpr Capabilities kTwoPhase{
-        .two_phase = true, .prepared_survives = true, .sequences = true, .typed_parameters = true};
+        .two_phase = true, .prepared_survives = true, .lobs = true, .sequences = true, .typed_parameters = true};
     return home_->TwoPhase() ? kTwoPhase : kOnePhase;
 }
 

@@ -59,10 +59,6 @@ constexpr const char* kFind =
     " join pg_catalog.pg_namespace n on n.oid = c.relnamespace where c.relname = $1"
     " and case when $2 = '' then pg_catalog.pg_table_is_visible(c.oid) else n.nspname = $2 end"
     " and c.relkind in ('r', 'p', 'f', 'v', 'm', 'S')";
-constexpr const char* kColumns =
-    "select a.attname, coalesce(nullif(t.typbasetype, 0), t.oid), a.atttypmod, a.attnotnull from pg_catalog.pg_attribute a"
-    " join pg_catalog.pg_type t on t.oid = a.atttypid"
-    " where a.attrelid = $1::oid and a.attnum > 0 and not a.attisdropped order by a.attnum";
 constexpr const char* kSequence =
     "select seqstart, seqincrement, seqmin, seqmax from pg_catalog.pg_sequence where seqrelid = $1::oid";
 constexpr const char* kSchema = "select nspname from pg_catalog.pg_namespace where nspname = $1";
@@ -115,19 +111,20 @@ Status PgConnection::Describe(std::string_view name, ObjectKind kind, ObjectDesc
     described.schema = ShownText(found, 0, 2);
     described.name = ShownText(found, 0, 3);
     const bool is_sequence = described.kind == ObjectKind::sequence;
-    status = Ask(is_sequence ? kSequence : kColumns, {Text(found, 0, 0)}, rows);
+    if (!is_sequence) {
+        Table table;
+        status = ReadTable(static_cast<Oid>(std::stoul(Text(found, 0, 0))), table);
+        for (TableColumn& column : table.columns)
+            if (!column.name.empty()) described.columns.push_back(std::move(column.described));
+    } else {
+        status = Ask(kSequence, {Text(found, 0, 0)}, rows);
+    }
     if (!status.Ok()) return status;
     if (is_sequence && PQntuples(rows.get()) == 1) {
         described.sequence_start = Integer(rows, 0);
         described.sequence_step = Integer(rows, 1);
         described.sequence_least = Integer(rows, 2);
         described.sequence_most = Integer(rows, 3);
-    }
-    for (int row = 0; !is_sequence && row < PQntuples(rows.get()); ++row) {
-        Column& column = described.columns.emplace_back();
-        column.name = ShownText(rows, row, 0);
-        DescribeType(static_cast<Oid>(std::stoul(Text(rows, row, 1))), std::atoi(PQgetvalue(rows.get(), row, 2)), column);
-        column.nullable = Text(rows, row, 3) == "f";
     }
     object = std::move(described);
     return status;

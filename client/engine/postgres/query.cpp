@@ -15,6 +15,7 @@ namespace {
 constexpr std::uint32_t kLargestBatch = 1000;            // rows
 constexpr std::size_t kBatchBytes = std::size_t{1} << 20;
 constexpr std::uint32_t kRowsBetweenPushes = 64;
+constexpr std::size_t kFieldsOfPlace = 3;
 constexpr std::string_view kReturningRow = " returning ctid";
 
 Verb VerbOf(std::string_view sql) {
@@ -106,9 +107,30 @@ Status PgQuery::Prepare(std::uint32_t& error_offset) {
     if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return {};
     tail_ = InsertsRows() ? kReturningRow : std::string_view();
     Status status = PrepareTyped(error_offset);
-    if (tail_.empty() || status.Ok() || connection_.Broken()) return status;
-    tail_ = {};
-    return PrepareTyped(error_offset);
+    if (!tail_.empty() && !status.Ok() && !connection_.Broken()) {
+        tail_ = {};
+        status = PrepareTyped(error_offset);
+    }
+    return status.Ok() && !lobs_.empty() ? PrepareLobs() : status;
+}
+
+// A list with large objects is asked for with the places of its rows, where the server can tell them.
+Status PgQuery::PrepareLobs() {
+    const std::string text = WithPlaces(sql_, columns_.size(), lobs_, connection_.Server().ServerHasUtf8());
+    Result description;
+    std::uint32_t offset = 0;
+    std::string name = connection_.NewName();
+    const auto fields = static_cast<int>(columns_.size() + lobs_.size() + kFieldsOfPlace);
+    Status status = text.empty() ? Refused(errors::kUnsupported) : SendPrepared(name, text, bound_.Types(), description, offset);
+    if (connection_.Broken()) return status;
+    if (status.Ok() && PQnfields(description.get()) == fields) {
+        connection_.Forget(std::exchange(name_, std::move(name)));
+        at_hand_.lobs.resize(lobs_.size());
+        return {};
+    }
+    if (status.Ok()) connection_.Forget(name);
+    lobs_.clear();
+    return {};
 }
 
 Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
@@ -129,19 +151,26 @@ Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
 }
 
 Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset) {
-    Wire& server = connection_.Server();
     connection_.Forget(name_);
     connection_.Forget(std::exchange(whole_name_, {}));
     whole_ = Whole::unknown;
     name_.clear();
     std::string name = connection_.NewName();
-    const std::string text = sql_ + std::string(tail_);
+    Result description;
+    Status status = SendPrepared(name, sql_ + std::string(tail_), types, description, error_offset);
+    if (!status.Ok()) return status;
+    name_ = std::move(name);
+    return Describe(description.get());
+}
+
+Status PgQuery::SendPrepared(const std::string& name, const std::string& text, const std::vector<Oid>& types,
+                             Result& description, std::uint32_t& error_offset) {
+    Wire& server = connection_.Server();
     const PgConnection::Guard guard = connection_.SendGuard(false);
     server.SendPrepare(name.c_str(), text.c_str(), types);
     server.SendDescribe(name.c_str());
     connection_.SendRelease(guard);
     Status status = connection_.PassGuard(guard);
-    Result description;
     for (int command = 0; status.Ok() && command < 2;) {
         Result result = server.Next();
         if (server.Broken()) break;
@@ -152,23 +181,30 @@ Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_of
         } else description = std::move(result);
     }
     Status rest = server.Drain();
-    status = connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
-    if (!status.Ok()) return status;
-    name_ = std::move(name);
-    return Describe(description.get());
+    return connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
 }
 
 // Throws before anything is changed, or the query is none.
 Status PgQuery::Describe(const PGresult* result) {
     std::vector<Oid> types;
-    for (int index = 0; index < PQnparams(result); ++index) types.push_back(PQparamtype(result, index));
-    const int count = tail_.empty() ? PQnfields(result) : 0;
-    columns_.assign(static_cast<std::size_t>(count), {});
-    rooms_.resize(columns_.size());
-    values_.resize(columns_.size());
-    readers_.resize(columns_.size());
+    for (int index = 0; index < PQnparams(result); ++index) {
+        const Oid type = PQparamtype(result, index);
+        Oid base = type;
+        if (Status status = connection_.BaseType(base); !status.Ok()) return status;
+        types.push_back(base == oid::kBytes || IsTextType(base) ? base : type);
+    }
     parameters_.resize(types.size());
     bound_.SetTypes(std::move(types));
+    return DescribeColumns(result);
+}
+
+Status PgQuery::DescribeColumns(const PGresult* result) {
+    const int count = tail_.empty() ? PQnfields(result) : 0;
+    lobs_.clear();
+    columns_.assign(static_cast<std::size_t>(count), {});
+    at_hand_.rooms.resize(columns_.size());
+    at_hand_.values.resize(columns_.size());
+    readers_.resize(columns_.size());
     binary_ = true;
     has_cursors_ = false;
     for (int index = 0; index < count; ++index) {
@@ -182,11 +218,16 @@ Status PgQuery::Describe(const PGresult* result) {
         columns_[place].name = type == oid::kTupleId ? "ROWID" : ShownName(PQfname(result, index));
         readers_[place] = binary_ ? BinaryReader(type) : TextReader(type);
         const Oid table = PQftable(result, index);
-        const auto column = static_cast<std::size_t>(std::max(PQftablecol(result, index), 0));
-        if (table == 0 || column == 0) continue;
-        std::vector<bool> not_null;
-        if (Status status = connection_.NotNull(table, not_null); !status.Ok()) return status;
-        columns_[place].nullable = column >= not_null.size() || !not_null[column];
+        const auto number = static_cast<std::size_t>(std::max(PQftablecol(result, index), 0));
+        if (table == 0 || number == 0) continue;
+        std::shared_ptr<const Table> known;
+        if (Status status = connection_.TableOf(table, known); !status.Ok()) return status;
+        if (number >= known->columns.size()) continue;
+        const TableColumn& column = known->columns[number];
+        DescribeColumn(type, PQfmod(result, index), column.domain, columns_[place]);
+        columns_[place].nullable = column.described.nullable;
+        if (IsLob(columns_[place])) readers_[place] = binary_ ? WholeBinaryReader(type) : WholeTextReader(type);
+        if (auto lob = LobColumnOf(*known, number, columns_[place])) lobs_.push_back({place, std::move(lob)});
     }
     return {};
 }
@@ -214,6 +255,8 @@ Status PgQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcom
     Close();
     if (connection_.Server().Asked()) return PgConnection::Stopped();
     outcome.failures.reserve(outcome.failures.size() + 2);
+    const bool undoes = savepoint_.verb == PgConnection::SavepointCommand::Verb::undo;
+    if (undoes && connection_.CheckSavepoint(savepoint_).Ok()) connection_.Large().Forget();    // what it would undo
     if (Status status = connection_.Enter(effect_); !status.Ok()) return status;
     if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return ExecuteSavepoint(outcome);
     if (effect_ == Effect::changes) return ExecuteRows(source, run, outcome);
@@ -380,6 +423,7 @@ PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t row, RowSi
     }
     if (batch.failure.Ok() && rows) {
         batch.affected = AffectedBy(rows.get());
+        connection_.Note();    // that a transaction has begun
         batch.failure = Deliver(rows.get(), row, sink);
     }
     if (batch.failure.Ok() && guard == PgConnection::Guard::savepoint) batch.failure = connection_.DropGuard();
@@ -391,7 +435,7 @@ Status PgQuery::Deliver(const PGresult* result, std::uint32_t row, RowSink& sink
     Status status;
     for (int index = 0; index < PQntuples(result) && status.Ok(); ++index) {
         status = Fill(result, index);
-        if (status.Ok()) status = sink.Row(row, values_);
+        if (status.Ok()) status = sink.Row(row, at_hand_.values);
     }
     return status;
 } catch (const std::bad_alloc&) {

@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "engine/engine.h"
-#include "engine/postgres/connection.h"
+#include "engine/postgres/lob_store.h"
 #include "engine/postgres/types.h"
 #include "engine/row_store.h"
 
@@ -59,7 +59,11 @@ private:
 
     Status PrepareTyped(std::uint32_t& error_offset);
     Status PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset);
+    Status SendPrepared(const std::string& name, const std::string& text, const std::vector<Oid>& types,
+                        Result& description, std::uint32_t& error_offset);
     Status Describe(const PGresult* result);
+    Status DescribeColumns(const PGresult* result);
+    Status PrepareLobs();
     [[nodiscard]] bool InsertsRows() const;
     bool RetypesTimes(std::vector<Oid>& types) const;
     Status PrepareAnew();
@@ -89,7 +93,10 @@ private:
     Status Finish(Status status) noexcept;
     Status Keep(std::uint64_t rows);
     Status KeepRow();
+    Status GiveTo(RowSink& sink);
+    void Hold();
     Status Fill(const PGresult* result, int row);
+    Status FillLobs(const PGresult* result, int row);
 
     PgConnection& connection_;
     const std::string sql_;
@@ -106,8 +113,15 @@ private:
     std::vector<std::string> arrays_;
     std::vector<Column> columns_;
     std::vector<Reader> readers_;
-    std::vector<ValueRoom> rooms_;
-    std::vector<Datum> values_;            // the row at hand
+    std::vector<LobItem> lobs_;            // columns whose rows' places come behind the others
+    // The row at hand: its values, and what they show beside the result.
+    struct RowAtHand {
+        std::vector<Datum> values;
+        std::vector<ValueRoom> rooms;
+        std::vector<std::string> lobs;
+    } at_hand_;
+    bool delivers_ = false;                // the sink has the row at hand
+    RowAtHand held_;                       // or this one, where the sink itself has the rest read ahead
     bool binary_ = true;
     bool has_cursors_ = false;
 

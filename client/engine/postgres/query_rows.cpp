@@ -100,7 +100,7 @@ Status PgQuery::Fetch(RowSink& sink, std::uint32_t most, bool& more) {
             if (!scrollable_) Close();
             return status;
         }
-        status = sink.Row(0, values_);
+        status = GiveTo(sink);
     }
     more = IsOpen();
     return status;
@@ -117,13 +117,58 @@ Status PgQuery::Next(bool& found) {
     }
     if (scrollable_ || state_ == State::drained) {
         found = next_ < store_.Size();
-        Status status = found ? store_.Read(next_, values_) : end_;
+        Status status = found ? store_.Read(next_, at_hand_.values) : end_;
         if (found && status.Ok()) ++next_;
         return status;
     }
-    state_ = State::coming;
     found = true;
-    return Fill(row_.get(), 0);
+    Status status = Fill(row_.get(), 0);
+    state_ = State::coming;
+    return status;
+}
+
+// What the sink reads of large objects may have the rest of the rows read ahead. A row that it found no memory for comes
+// again.
+Status PgQuery::GiveTo(RowSink& sink) {
+    const bool came = state_ == State::coming && !scrollable_;
+    struct Delivery {
+        PgQuery& query;
+        ~Delivery() {
+            query.delivers_ = false;
+            query.held_ = {};
+        }
+    } const delivery{*this};
+    delivers_ = true;
+    try {
+        return sink.Row(0, at_hand_.values);
+    } catch (const std::bad_alloc&) {
+        if (came && state_ == State::coming) state_ = State::on_row;
+        else --next_;
+        throw;
+    }
+}
+
+// The row that the sink has keeps its values, as copies; the next ones get another place.
+void PgQuery::Hold() {
+    if (!scrollable_) {
+        if (Status status = store_.Add(at_hand_.values); status.Failed()) throw std::bad_alloc();
+        next_ = 1;
+    }
+    RowAtHand other;
+    other.values.resize(at_hand_.values.size());
+    other.rooms.resize(at_hand_.rooms.size());
+    other.lobs.resize(at_hand_.lobs.size());
+    std::vector<std::string> copies(at_hand_.values.size());
+    for (std::size_t index = 0; index < copies.size(); ++index) {
+        const Datum& value = at_hand_.values[index];
+        if (value.length > 0) copies[index] = value.Text();
+    }
+    held_ = std::exchange(at_hand_, std::move(other));
+    held_.lobs = std::move(copies);
+    for (std::size_t index = 0; index < held_.lobs.size(); ++index) {
+        if (held_.values[index].length > 0) held_.values[index].data = held_.lobs[index].data();
+    }
+    delivers_ = false;
 }
 
 // Copies the next row into the store.
@@ -132,7 +177,7 @@ Status PgQuery::KeepRow() {
         if (Status status = Step(); !status.Ok() || state_ == State::drained) return status;
     }
     Status status = Fill(row_.get(), 0);
-    if (status.Ok()) status = store_.Add(values_);
+    if (status.Ok()) status = store_.Add(at_hand_.values);
     if (status.Ok()) state_ = State::coming;
     return status;
 }
@@ -148,6 +193,7 @@ void PgQuery::ReadAhead() noexcept {
     const Wire::Heeding undisturbed(connection_.Server(), false);
     Status status;
     try {
+        if (delivers_) Hold();
         while (status.Ok() && state_ != State::drained) status = KeepRow();
     } catch (const std::bad_alloc&) {
         status = Refused(errors::kOutOfMemory);
@@ -181,10 +227,10 @@ Status PgQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
     if (!status.Ok()) return Ended(std::move(status));
     next_ = std::min(position, store_.Size());
     if (position == 0 || position > store_.Size()) return status;
-    status = store_.Read(position - 1, values_);
+    status = store_.Read(position - 1, at_hand_.values);
     if (!status.Ok()) return Ended(std::move(status));
     found = true;
-    return sink.Row(0, values_);
+    return sink.Row(0, at_hand_.values);
 }
 
 Status PgQuery::Count(std::uint64_t& rows) {
@@ -210,18 +256,61 @@ void PgQuery::Close() noexcept {
 
 // A row as views of the result, or of the rooms.
 Status PgQuery::Fill(const PGresult* result, int row) {
-    const int count = static_cast<int>(values_.size());
-    if (PQnfields(result) != count) return Refused(errors::kSchemaChanged);
+    const int count = static_cast<int>(at_hand_.values.size());
+    const auto places = static_cast<int>(lobs_.empty() ? 0 : lobs_.size() + 3);
+    if (PQnfields(result) != count + places) return Refused(errors::kSchemaChanged);
     for (int index = 0; index < count; ++index) {
         const auto place = static_cast<std::size_t>(index);
-        Datum& value = values_[place];
+        Datum& value = at_hand_.values[place];
         if (PQgetisnull(result, row, index)) {
             value = {};
             continue;
         }
         const std::string_view bytes(PQgetvalue(result, row, index),
                                      static_cast<std::size_t>(PQgetlength(result, row, index)));
-        if (const int error = readers_[place](bytes, rooms_[place], value)) return Refused(error);
+        if (const int error = readers_[place](bytes, at_hand_.rooms[place], value)) return Refused(error);
+    }
+    return lobs_.empty() ? Status() : FillLobs(result, row);
+}
+
+// Behind the columns stand the lengths of the large objects, then the row's table, place and transaction.
+Status PgQuery::FillLobs(const PGresult* result, int row) {
+    const auto first = static_cast<int>(at_hand_.values.size());
+    const int version = first + static_cast<int>(lobs_.size());
+    const auto read = [&](int field, Oid type, ValueRoom& room, Datum& value) {
+        const std::string_view bytes(PQgetvalue(result, row, field), static_cast<std::size_t>(PQgetlength(result, row, field)));
+        return (binary_ ? BinaryReader(type) : TextReader(type))(bytes, room, value);
+    };
+    ValueRoom room;
+    Datum table, place, transaction, length;
+    if (PQgetisnull(result, row, version + 1) || read(version, oid::kInt8, room, table) != 0 ||
+        read(version + 2, oid::kInt8, room, transaction) != 0 || read(version + 1, oid::kTupleId, room, place) != 0)
+        return Refused(errors::kInternalError, "a row without a place");
+    char tuple[kTupleIdSize];
+    TupleIdOf(place.Row(), tuple);
+    LobView view;
+    view.version = {static_cast<Oid>(table.integer), static_cast<std::uint32_t>(transaction.integer),
+                    std::uint64_t{Get<std::uint32_t>(tuple)} << 16 | Get<std::uint16_t>(tuple + 4)};
+    view.is_locked = effect_ == Effect::locks || effect_ == Effect::changes;
+    view.seen_at = connection_.Large().Now();
+    for (std::size_t index = 0; index < lobs_.size(); ++index) {
+        Datum& value = at_hand_.values[lobs_[index].index];
+        const int field = first + static_cast<int>(index);
+        if (PQgetisnull(result, row, field)) {
+            value = {};
+            continue;
+        }
+        ValueRoom number;
+        if (const int error = read(field, oid::kInt8, number, length)) return Refused(error);
+        view.column = &lobs_[index].column;
+        view.length = static_cast<std::uint64_t>(length.integer);
+        view.is_whole = value.kind != Kind::null && value.length == view.length;
+        std::string& bytes = at_hand_.lobs[index];
+        bytes.assign(reinterpret_cast<const char*>(&view), sizeof view);
+        if (view.is_whole) bytes.append(value.Text());
+        value.kind = Kind::lob;
+        value.length = static_cast<std::uint32_t>(bytes.size());
+        value.data = bytes.data();
     }
     return {};
 }

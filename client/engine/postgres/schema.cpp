@@ -12,7 +12,20 @@ set local search_path = pg_catalog;
 set local client_min_messages = error;
 create schema if not exists kelp;
 grant usage on schema kelp to public;
-do $$ begin create domain kelp.date as timestamp(0); exception when duplicate_object then null; end $$;
+do $$
+declare
+    made record;
+begin
+    for made in
+        select * from (values ('date', 'timestamp(0)'), ('raw', 'bytea'), ('long_raw', 'bytea'), ('long', 'text'),
+            ('nclob', 'text'), ('dbclob', 'text')) as list(name, type)
+    loop
+        begin
+            execute format('create domain kelp.%I as %s', made.name, made.type);
+        exception when duplicate_object then null;
+        end;
+    end loop;
+end $$;
 
 create or replace function kelp.fail(number int, words text) returns void language plpgsql as
 $$ begin raise exception 'kelp error % %', number, words; end $$;
@@ -176,6 +189,8 @@ create or replace function kelp.replace(text, text) returns text immutable paral
 return nullif(pg_catalog.replace($1, $2, ''), '');
 create or replace function kelp.hextoraw(text) returns bytea immutable parallel safe language sql
 return pg_catalog.decode($1, 'hex');
+create or replace function kelp.empty_clob() returns text immutable parallel safe language sql return ''::text;
+create or replace function kelp.empty_blob() returns bytea immutable parallel safe language sql return ''::bytea;
 create or replace function kelp.rawtohex(bytea) returns text immutable parallel safe language sql
 return upper(encode($1, 'hex'));
 
@@ -251,7 +266,7 @@ begin
         end;
     end loop;
 end $$;
-comment on schema kelp is 'libkelpci 1';
+comment on schema kelp is 'libkelpci 2';
 commit;
 )sql";
 

@@ -3,7 +3,7 @@
 #include <charconv>
 #include <string>
 
-#include "engine/postgres/connection.h"
+#include "engine/postgres/lob_store.h"
 #include "handles/errors.h"
 
 namespace engine::postgres {
@@ -74,6 +74,8 @@ Status PgConnection::Prepare(const Xid& xid, bool& read_only) {
     read_only = false;
     const std::string command = "prepare transaction '" + NameOf(xid) + "'";
     if (!home_->TwoPhase()) return Refused(errors::kUnsupported, "the server has max_prepared_transactions = 0");
+    if (Status status = Enter(); !status.Ok()) return status;
+    if (Status settled = lobs_->Settle(); settled.Failed()) return Lose(settled);
     Result number;
     if (Status status = Ask("select pg_catalog.pg_current_xact_id_if_assigned()::text", {}, number); !status.Ok())
         return status;

@@ -37,6 +37,12 @@ int ReadBytes(std::string_view bytes, ValueRoom&, Datum& value) {
     return 0;
 }
 
+template <Kind kind>
+int ReadWhole(std::string_view bytes, ValueRoom&, Datum& value) {
+    SetView(value, kind, bytes.data(), bytes.size());
+    return 0;
+}
+
 int GiveInteger(std::int64_t integer, Datum& value) {
     value.kind = Kind::integer;
     value.length = 0;
@@ -142,6 +148,11 @@ int TextToBytes(std::string_view text, ValueRoom& room, Datum& value) {
     return ReadBytes({bytes, count}, room, value);
 }
 
+int TextToWholeBytes(std::string_view text, ValueRoom& room, Datum& value) {
+    TextToBytes(text, room, value);
+    return value.kind == Kind::null ? ReadWhole<Kind::bytes>({text.data(), 0}, room, value) : 0;
+}
+
 int TextToTupleId(std::string_view text, ValueRoom& room, Datum& value) {
     char bytes[kTupleIdSize];
     char* end = nullptr;
@@ -227,6 +238,36 @@ void DescribeType(Oid type, int modifier, Column& column) {
     }
 }
 
+void DescribeColumn(Oid type, int modifier, std::string_view domain, Column& column) {
+    constexpr std::uint32_t kLocatorSize = 4000;
+    constexpr struct {
+        Oid type;
+        std::string_view domain;
+        std::uint16_t described;
+        std::uint32_t size;
+        bool national;
+    } kColumns[] = {
+        {oid::kText, "long", SQLT_LNG, 0, false},
+        {oid::kText, "nclob", SQLT_CLOB, kLocatorSize, true},
+        {oid::kText, "dbclob", SQLT_DBCLOB, kLocatorSize, false},
+        {oid::kText, "", SQLT_CLOB, kLocatorSize, false},
+        {oid::kBytes, "raw", SQLT_BIN, 0, false},
+        {oid::kBytes, "long_raw", SQLT_LBI, 0, false},
+        {oid::kBytes, "", SQLT_BLOB, kLocatorSize, false},
+    };
+    DescribeType(type, modifier, column);
+    for (const auto& row : kColumns) {
+        if (row.type != type || row.domain != domain) continue;
+        column.type = row.described;
+        column.size = row.size;
+        column.national = row.national;
+    }
+}
+
+bool IsLob(const Column& column) {
+    return column.type == SQLT_CLOB || column.type == SQLT_DBCLOB || column.type == SQLT_BLOB;
+}
+
 std::string ShownName(std::string_view name) {
     std::string other(name);
     bool upper = false, lower = false;
@@ -248,6 +289,9 @@ Reader TextReader(Oid type) {
     const TypeRow* row = Find(type);
     return row ? row->text : ReadText;
 }
+
+Reader WholeBinaryReader(Oid type) { return type == oid::kBytes ? ReadWhole<Kind::bytes> : ReadWhole<Kind::text>; }
+Reader WholeTextReader(Oid type) { return type == oid::kBytes ? TextToWholeBytes : ReadWhole<Kind::text>; }
 
 bool IsTextType(Oid type) {
     return type == oid::kText || type == kVarying || type == kFixed || type == kName || type == kUnknown;

@@ -22,6 +22,9 @@ constexpr Oid kNumeric = 1700, kCursor = 1790;
 
 // A column's type, size and numbers by type and modifier; name and nullability are left alone.
 void DescribeType(Oid type, int modifier, Column& column);
+// The same of a column of a table or view: `domain` is the name of its type where that is one of the schema kelp.
+void DescribeColumn(Oid type, int modifier, std::string_view domain, Column& column);
+bool IsLob(const Column& column);
 // A name as the application sees it, and the other way round: all of it in the other letter case, unless it has both. What
 // is written without quotes is in upper case there and in lower case here.
 std::string ShownName(std::string_view name);
@@ -38,6 +41,9 @@ union ValueRoom {
 using Reader = int (*)(std::string_view bytes, ValueRoom& room, Datum& value);
 Reader BinaryReader(Oid type);    // null: the type is read as text
 Reader TextReader(Oid type);
+// The same of texts and bytes, but an empty one is no null.
+Reader WholeBinaryReader(Oid type);
+Reader WholeTextReader(Oid type);
 bool IsTextType(Oid type);
 
 // The type that a placeholder is declared as by the kind of its values; 0: the server finds one.

@@ -138,6 +138,12 @@ void Wire::SendQuery(const char* sql, const std::vector<const char*>& texts) noe
     Sent(PQsendQueryParams(connection_, sql, static_cast<int>(texts.size()), nullptr, texts.data(), nullptr, nullptr, 0));
 }
 
+void Wire::SendQuery(const char* sql, const Values& values, bool binary_results) noexcept {
+    if (broken_ || short_of_memory_) return;
+    Sent(PQsendQueryParams(connection_, sql, static_cast<int>(values.data.size()), nullptr, values.data.data(),
+                           values.lengths.data(), values.formats.data(), binary_results));
+}
+
 void Wire::SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept {
     if (broken_ || short_of_memory_) return;
     Sent(PQsendPrepare(connection_, name, sql, static_cast<int>(types.size()), types.data()));

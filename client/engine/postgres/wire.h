@@ -39,21 +39,26 @@ public:
 
     [[nodiscard]] PGconn* Libpq() const { return connection_; }
     [[nodiscard]] bool Broken() const { return broken_; }
-    // What the server said last: whether a transaction is open, or has failed.
     [[nodiscard]] std::string Where() const {    // host, port and database
         return std::string(PQhost(connection_)) + ':' + PQport(connection_) + '/' + PQdb(connection_);
     }
+    [[nodiscard]] bool ServerHasUtf8() const {
+        const char* const set = PQparameterStatus(connection_, "server_encoding");
+        return set && std::string_view(set) == "UTF8";
+    }
+    // What the server said last: whether a transaction is open, or has failed.
     [[nodiscard]] PGTransactionStatusType Transaction() const { return PQtransactionStatus(connection_); }
 
     // ---- Sending. A failure breaks off; what was sent before is read by Drain.
     void Send(const char* sql) noexcept;
     void SendQuery(const char* sql, const std::vector<const char*>& texts) noexcept;    // with texts as values
-    void SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept;
-    void SendDescribe(const char* name) noexcept;
     struct Values {
         std::vector<const char*> data;    // null: null
         std::vector<int> lengths, formats;
     };
+    void SendQuery(const char* sql, const Values& values, bool binary_results) noexcept;
+    void SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept;
+    void SendDescribe(const char* name) noexcept;
     void SendExecute(const char* name, const Values& values, bool binary_results) noexcept;
     void Sync() noexcept;
     void OneByOne() noexcept { PQsetSingleRowMode(connection_); }    // the rows of the command that is read next

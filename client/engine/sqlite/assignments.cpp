@@ -8,9 +8,9 @@
 #include <string>
 #include <utility>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/operands.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/table_columns.h"
 #include "handles/errors.h"
 

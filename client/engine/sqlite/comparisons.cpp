@@ -9,10 +9,10 @@
 #include <string>
 #include <utility>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/function_values.h"
 #include "engine/sqlite/operands.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/table_columns.h"
 #include "handles/errors.h"

@@ -4,8 +4,8 @@
 #include <string>
 
 #include "date/format.h"
+#include "engine/pieces.h"
 #include "engine/sqlite/function_values.h"
-#include "engine/sqlite/pieces.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {

@@ -4,10 +4,10 @@
 #include <algorithm>
 #include <new>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/connection.h"
 #include "engine/sqlite/functions.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/stored_number.h"
 #include "oci.h"

@@ -9,12 +9,12 @@
 
 #include "date/date.h"
 #include "date/zone.h"
+#include "engine/pieces.h"
 #include "engine/sqlite/characters.h"
 #include "engine/sqlite/coercion.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/function_values.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/stored_number.h"
 #include "handles/errors.h"
 #include "number/number.h"

@@ -6,75 +6,22 @@
 #include <optional>
 #include <string>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/describe.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/table_columns.h"
 
 namespace engine::sqlite {
 namespace {
 
-using PieceList = std::vector<std::string_view>;
-
 bool IsLob(const Column& column) {
     return column.type == SQLT_CLOB || column.type == SQLT_DBCLOB || column.type == SQLT_BLOB;
 }
 
-bool IsAnyOf(std::string_view piece, std::initializer_list<std::string_view> words) {
-    return std::any_of(words.begin(), words.end(), [&](std::string_view word) { return IsWord(piece, word); });
-}
-
-// The list, the table, and what the list calls the table by.
-struct ListOfTable {
-    Span list;
-    TableName table;
-    std::string_view alias;    // a piece; empty: the table's name
-};
-
-// The first of some words outside of parentheses; the end of the text when there is none.
-std::size_t Find(const PieceList& pieces, std::size_t from, std::initializer_list<std::string_view> words) {
-    int depth = 0;
-    for (std::size_t index = from; index < pieces.size(); ++index) {
-        if (depth == 0 && IsAnyOf(pieces[index], words)) return index;
-        if (pieces[index] == "(") ++depth;
-        if (pieces[index] == ")") --depth;
-    }
-    return pieces.size();
-}
-
-// "select list from table [[as] alias] [where ...] [order by ...] [limit ...]", and nothing that makes rows of others.
-std::optional<ListOfTable> ReadSelect(const PieceList& pieces) {
-    if (pieces.empty() || !IsWord(pieces[0], "select") || (pieces.size() > 1 && IsWord(pieces[1], "distinct"))) return {};
-    const std::size_t first = pieces.size() > 1 && IsWord(pieces[1], "all") ? 2 : 1;
-    const std::size_t from = Find(pieces, first, {"from"});
-    if (from + 1 >= pieces.size() || !IsName(pieces[from + 1])) return {};
-    ListOfTable read;
-    read.list = {first, from};
-    std::size_t at = ReadTableName(pieces, from + 1, read.table);
-    const auto goes_on = [&] { return at < pieces.size() && pieces[at] != ";"; };
-    const auto is_clause = [&] { return IsAnyOf(pieces[at], {"where", "order", "limit"}); };
-    if (goes_on() && IsWord(pieces[at], "as")) ++at;
-    if (goes_on() && !is_clause() && IsName(pieces[at])) read.alias = pieces[at++];
-    if (goes_on() && !is_clause()) return {};
-    if (Find(pieces, at, {"union", "except", "intersect", "group", "having", "window"}) < pieces.size()) return {};
-    const std::size_t order = Find(pieces, at, {"order"});    // "order by 2" means the item
-    const bool by_number = std::any_of(pieces.begin() + static_cast<std::ptrdiff_t>(order), pieces.end(), IsNumber);
-    return by_number ? std::nullopt : std::optional(read);
-}
-
-// "insert into table ... returning list" and its kin.
-std::optional<ListOfTable> ReadReturning(const PieceList& pieces) {
-    if (pieces.size() < 4 || !IsAnyOf(pieces[0], {"insert", "update", "delete", "replace"})) return {};
-    const std::size_t returning = Find(pieces, 0, {"returning"});
-    if (returning == pieces.size()) return {};
-    std::size_t at = 1;
-    if (IsWord(pieces[at], "or")) at += 2;
-    if (IsAnyOf(pieces[at], {"into", "from"})) ++at;
-    ListOfTable read;
-    ReadTableName(pieces, at, read.table);
-    const std::size_t end = pieces.back() == ";" ? pieces.size() - 1 : pieces.size();
-    read.list = {returning + 1, end};
-    return read;
+// "order by 2" means the item.
+bool OrdersByNumber(const PieceList& pieces, const ListOfTable& read) {
+    const std::size_t order = FindPiece(pieces, read.list.last, {"order"});
+    return std::any_of(pieces.begin() + static_cast<std::ptrdiff_t>(order), pieces.end(), IsNumber);
 }
 
 // Whether it is a table whose rows have numbers of their own, and where it lies. Throws bad_alloc.
@@ -112,7 +59,7 @@ public:
         if (!FindTable(database_, read_.table)) return false;
         std::size_t begin = read_.list.first;
         while (begin < read_.list.last) {
-            const std::size_t end = std::min(Find(pieces_, begin, {","}), read_.list.last);
+            const std::size_t end = std::min(FindPiece(pieces_, begin, {","}), read_.list.last);
             RewriteItem({begin, end});
             begin = end + 1;
         }
@@ -198,7 +145,7 @@ std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std
     if (!MayHaveLobs(compiled, is_query)) return {};
     const PieceList pieces = Split(sql);
     const std::optional<ListOfTable> read = is_query ? ReadSelect(pieces) : ReadReturning(pieces);
-    if (!read) return {};
+    if (!read || (is_query && OrdersByNumber(pieces, *read))) return {};
     Rewriter rewriter(database, sql, pieces, *read, store);
     if (!rewriter.Rewrite(static_cast<std::size_t>(sqlite3_column_count(compiled))) || rewriter.items.empty()) return {};
     targets.edits.insert(targets.edits.end(), rewriter.edits.begin(), rewriter.edits.end());

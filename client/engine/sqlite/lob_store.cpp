@@ -134,6 +134,7 @@ private:
     std::uint64_t transaction_ = 0;     // it was fetched in; 0: none
     std::int64_t data_version_ = 0;     // of that transaction
     bool is_current_ = false;           // what it holds now counts, not what it held then
+    bool is_brief_ = false;             // the query that brings it is open, and sees nobody else's changes
     std::unique_ptr<ChunkedBytes> copy_;
 };
 
@@ -148,7 +149,7 @@ Status ColumnLob::Check() {
         const bool undone = Store().undone_at_ > seen_at_ && change.transaction == transaction_ && change.at > 0;
         if ((change.at > seen_at_ || undone) && !is_current_) return Error(errors::kSnapshotTooOld).From("SQLITE");
     }
-    if (Store().InTransaction(transaction_) || Store().connection_.Private()) return {};
+    if (is_brief_ || Store().InTransaction(transaction_) || Store().connection_.Private()) return {};
     return CheckOthers();
 }
 
@@ -255,6 +256,7 @@ Status LobStore::Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob)
     std::memcpy(&view, value.data, sizeof view);
     if (view.kept && (brief || !view.is_locked)) return lob = *view.kept, Status();
     auto made = std::make_shared<ColumnLob>(*this, view);
+    made->is_brief_ = brief;
     const bool in_transaction = connection_.InTransaction();
     if (in_transaction) made->transaction_ = transaction_;
     made->is_current_ = in_transaction && (view.is_locked || IsWrittenRow(**view.column, view.row));

@@ -7,10 +7,10 @@
 #include <string>
 #include <vector>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/accounts.h"
 #include "engine/sqlite/connection.h"
 #include "engine/sqlite/describe.h"
-#include "engine/sqlite/pieces.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {

@@ -5,7 +5,8 @@
 #include <array>
 #include <cctype>
 
-#include "engine/sqlite/pieces.h"
+#include "engine/pieces.h"
+
 
 namespace engine::sqlite {
 namespace {

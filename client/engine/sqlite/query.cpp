@@ -6,9 +6,9 @@
 #include <new>
 #include <optional>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/describe.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/query_parts.h"
 #include "engine/sqlite/row_number.h"
 #include "engine/sqlite/stored_number.h"

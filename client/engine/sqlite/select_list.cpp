@@ -4,9 +4,9 @@
 #include <algorithm>
 #include <array>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/functions.h"
 #include "engine/sqlite/operands.h"
-#include "engine/sqlite/pieces.h"
 
 namespace engine::sqlite {
 namespace {

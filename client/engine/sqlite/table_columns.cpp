@@ -6,10 +6,10 @@
 #include <new>
 #include <utility>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/coercion.h"
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/connection.h"
-#include "engine/sqlite/pieces.h"
 
 namespace engine::sqlite {
 namespace {
@@ -65,17 +65,6 @@ int Ask(sqlite3* database, const TableName& table, const char* column, const cha
 }
 
 }  // namespace
-
-std::size_t ReadTableName(const std::vector<std::string_view>& pieces, std::size_t at, TableName& table) {
-    table = {};
-    if (at >= pieces.size()) return at;
-    table.name = PlainName(pieces[at++]);
-    if (at + 1 < pieces.size() && pieces[at] == ".") {
-        table.schema = std::exchange(table.name, PlainName(pieces[at + 1]));
-        at += 2;
-    }
-    return at;
-}
 
 bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name, TableColumn& column) {
     const std::string plain = PlainName(name);

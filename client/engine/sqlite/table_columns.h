@@ -9,13 +9,9 @@
 #include <vector>
 
 #include "engine/engine.h"
+#include "engine/table_list.h"
 
 namespace engine::sqlite {
-
-struct TableName {
-    std::string schema;    // empty: any
-    std::string name;
-};
 
 struct TableColumn {
     std::string name;
@@ -23,9 +19,6 @@ struct TableColumn {
     Column column;           // described from them; the name in upper case
     bool concerned = false;  // values for the column are looked at
 };
-
-// Reads the name of a table, "name" or "schema.name", at pieces[at]. Answers where the text goes on.
-std::size_t ReadTableName(const std::vector<std::string_view>& pieces, std::size_t at, TableName& table);
 
 // The column of that name, which may be quoted, of a table or view; false when there is none. A row id is none.
 bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name, TableColumn& column);

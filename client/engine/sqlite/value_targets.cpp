@@ -5,9 +5,9 @@
 #include <array>
 #include <charconv>
 
+#include "engine/pieces.h"
 #include "engine/sqlite/assignments.h"
 #include "engine/sqlite/comparisons.h"
-#include "engine/sqlite/pieces.h"
 #include "engine/sqlite/stored_number.h"
 #include "engine/sqlite/table_columns.h"
 #include "number/number.h"

@@ -12,17 +12,11 @@
 #include <vector>
 
 #include "engine/engine.h"
+#include "engine/pieces.h"
 #include "engine/sqlite/coercion.h"
 #include "handles/status.h"
 
 namespace engine::sqlite {
-
-// Pieces [first, last) of a text.
-struct Span {
-    std::size_t first = 0;
-    std::size_t last = 0;
-    [[nodiscard]] std::size_t Size() const { return last - first; }
-};
 
 struct ValueTargets {
     struct Parameter {

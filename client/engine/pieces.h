@@ -1,4 +1,5 @@
-// Pieces of SQL text as SQLite reads it: words, numbers, quoted texts, placeholders, operators, single characters.
+// Pieces of SQL text: words, numbers, quoted texts, placeholders, operators, single characters. As SQLite reads it, and
+// as PostgreSQL does where no backslash or dollar sign makes quotes of another kind.
 // Comments and blanks are no pieces. All views are of the text. Pure functions; any thread.
 #pragma once
 
@@ -6,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-namespace engine::sqlite {
+namespace engine {
 
 class Pieces {
 public:
@@ -25,7 +26,15 @@ private:
     std::size_t at_ = 0;
 };
 
-std::vector<std::string_view> Split(std::string_view sql);
+// Pieces [first, last) of a text.
+struct Span {
+    std::size_t first = 0;
+    std::size_t last = 0;
+    [[nodiscard]] std::size_t Size() const { return last - first; }
+};
+
+using PieceList = std::vector<std::string_view>;
+PieceList Split(std::string_view sql);
 
 // Without regard to letter case; `lower` is in lower case.
 bool IsWord(std::string_view piece, std::string_view lower);
@@ -42,4 +51,4 @@ bool IsNumber(std::string_view piece);     // 12, .5, 1e-3; no sign
 std::string PlainName(std::string_view piece);
 std::string PlainText(std::string_view literal);
 
-}  // namespace engine::sqlite
+}  // namespace engine

@@ -1,12 +1,12 @@
 // Cutting SQL text into pieces.
-#include "engine/sqlite/pieces.h"
+#include "engine/pieces.h"
 
 #include <algorithm>
 #include <cctype>
 #include <cstdlib>
 #include <iterator>
 
-namespace engine::sqlite {
+namespace engine {
 namespace {
 
 bool IsDigit(char c) { return c >= '0' && c <= '9'; }
@@ -122,4 +122,4 @@ std::string PlainName(std::string_view piece) {
 
 std::string PlainText(std::string_view literal) { return Unquoted(literal); }
 
-}  // namespace engine::sqlite
+}  // namespace engine

@@ -1,0 +1,82 @@
+#include "engine/postgres/lob_columns.h"
+
+#include <algorithm>
+#include <cctype>
+#include <optional>
+
+#include "engine/postgres/types.h"
+#include "engine/table_list.h"
+#include "oci.h"
+
+namespace engine::postgres {
+namespace {
+
+// What quotes in ways of the server's own is left alone.
+bool QuotesOtherwise(std::string_view sql) {
+    if (sql.find('\\') != std::string_view::npos) return true;
+    for (std::size_t at = sql.find('$'); at != std::string_view::npos; at = sql.find('$', at + 1)) {
+        if (at + 1 == sql.size() || !std::isdigit(static_cast<unsigned char>(sql[at + 1]))) return true;
+    }
+    return false;
+}
+
+// Where the list of columns ends.
+std::optional<std::size_t> EndOfList(std::string_view sql, std::size_t& end_of_text) {
+    if (QuotesOtherwise(sql)) return {};
+    const PieceList pieces = Split(sql);
+    std::optional<ListOfTable> read = ReadSelect(pieces);
+    if (!read) read = ReadReturning(pieces);
+    if (!read || read->list.Size() == 0) return {};
+    const auto end_of = [&](std::size_t piece) {
+        return static_cast<std::size_t>(pieces[piece].data() - sql.data()) + pieces[piece].size();
+    };
+    end_of_text = end_of(pieces.back() == ";" ? pieces.size() - 2 : pieces.size() - 1);
+    return end_of(read->list.last - 1);
+}
+
+std::string ItemName(std::size_t index) { return "kelp_" + std::to_string(index + 1); }
+
+}  // namespace
+
+std::shared_ptr<const LobColumn> LobColumnOf(const Table& table, std::size_t number, const Column& column) {
+    if (!table.has_rows || !IsLob(column)) return nullptr;
+    const LobKind kind = column.type == SQLT_BLOB ? LobKind::bytes : LobKind::characters;
+    return std::make_shared<LobColumn>(LobColumn{kind, table.columns[number].name});
+}
+
+std::string BytesOf(const LobColumn& column, std::string_view value) {
+    if (column.kind == LobKind::bytes) return std::string(value);
+    return "pg_catalog.textsend(" + std::string(value) + ")";    // in the session's character set, which is UTF-8
+}
+
+std::string LengthOf(const LobColumn& column, std::string_view value, bool server_has_utf8) {
+    const bool as_it_is = column.kind == LobKind::bytes || server_has_utf8;    // tells without reading it
+    return "pg_catalog.octet_length(" + (as_it_is ? std::string(value) : BytesOf(column, value)) + ")";
+}
+
+std::string WithPlaces(std::string_view sql, std::size_t columns, const std::vector<LobItem>& items,
+                       bool server_has_utf8) {
+    std::size_t end = 0;
+    const std::optional<std::size_t> list = EndOfList(sql, end);
+    if (!list) return {};
+    std::string names, wanted, lengths;
+    for (std::size_t index = 0; index < columns; ++index) {
+        const std::string name = ItemName(index);
+        names += name + ", ";
+        if (index > 0) wanted += ", ";
+        const auto item = std::find_if(items.begin(), items.end(), [&](const LobItem& lob) { return lob.index == index; });
+        if (item == items.end()) {
+            wanted += name;
+            continue;
+        }
+        const std::string length = LengthOf(*item->column, name, server_has_utf8);
+        wanted += "case when " + length + " <= " + std::to_string(kLongestInline) + " then " + name + " end";
+        lengths += ", " + length + "::bigint";
+    }
+    std::string text = "with kelp_q(" + names + "kelp_table, kelp_place, kelp_transaction) as (";
+    text.append(sql.substr(0, *list)).append(", tableoid, ctid, xmin").append(sql.substr(*list, end - *list));
+    return text + "\n) select " + wanted + lengths +
+           ", kelp_table::bigint, kelp_place, kelp_transaction::text::bigint from kelp_q";
+}
+
+}  // namespace engine::postgres

@@ -1,0 +1,112 @@
+// Large objects of PostgreSQL tables, and temporary ones. What is short comes with its row; what is longer is read in
+// pieces, by the table and place of the row's version and the transaction that made it: a version never changes, and one
+// that can no longer be seen is refused. A value that the transaction has locked is what its row holds now: the versions
+// that the row gets are followed. What is written is collected in a draft, outside of the server, which becomes the
+// column's value (one update) before anything could see it: before the next statement of the connection, a mark, or the
+// commit.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+#include "engine/chunked_bytes.h"
+#include "engine/lobs.h"
+#include "engine/postgres/lob_columns.h"
+
+namespace engine::postgres {
+
+// One version of a row of a table.
+struct RowVersion {
+    Oid table = 0;
+    std::uint32_t transaction = 0;    // that made it
+    std::uint64_t place = 0;          // block and offset in it, as in a row id
+    bool operator==(const RowVersion&) const = default;
+};
+struct RowVersionHash {
+    std::size_t operator()(const RowVersion& version) const noexcept {
+        return std::hash<std::uint64_t>()(version.place * 31 + version.transaction) * 31 + version.table;
+    }
+};
+
+// What is known of one row.
+struct LobRow {
+    std::vector<RowVersion> versions;    // that it had; the last one known comes last
+    std::uint64_t checked_at = 0;        // when the last one was seen to be the row's
+};
+
+// The value of a Datum of Kind::lob; the bytes follow where they came with the row.
+struct LobView {
+    const std::shared_ptr<const LobColumn>* column = nullptr;
+    RowVersion version;
+    bool is_locked = false;      // by the statement that brings it
+    bool is_whole = false;       // its bytes follow
+    std::uint64_t length = 0;
+    std::uint64_t seen_at = 0;
+};
+
+class PgLobStore final : public LobStore {
+public:
+    explicit PgLobStore(PgConnection& connection);
+    ~PgLobStore() override;
+    PgLobStore(const PgLobStore&) = delete;
+    PgLobStore& operator=(const PgLobStore&) = delete;
+
+    Status CreateTemporary(LobKind kind, std::shared_ptr<Lob>& lob) override;
+    Status Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob) override;
+
+    // ---- For the connection
+
+    [[nodiscard]] std::uint64_t Now() const { return now_; }    // another number behind each statement
+    void StatementRuns() noexcept { ++now_; }
+    // Drafts become values. The values of drafts that fail stay as they were; where memory failed, the drafts wait.
+    Status Settle();
+    void Forget() noexcept;                 // the drafts: what they are of is undone, or part of it
+    void Undone() noexcept { undone_at_ = ++now_; }    // some of the transaction, not its drafts
+    void TransactionBegins() noexcept { ++transaction_; }
+
+private:
+    friend class ColumnLob;
+    struct Draft {
+        std::shared_ptr<LobRow> row;
+        std::shared_ptr<const LobColumn> column;
+        std::shared_ptr<Lob> value;
+    };
+    struct Shared {
+        PgLobStore* store;
+    };
+
+    std::shared_ptr<LobRow> RowOf(const RowVersion& version);
+    void Follow(std::shared_ptr<LobRow>& row, const RowVersion& version);
+    void Sweep();
+    Lob* FindDraft(const LobRow& row, const LobColumn& column);
+    Status Flush(Draft& draft);
+    Status Upload(Lob& value, std::uint64_t length, Oid& object);
+    Status Update(Draft& draft, const std::string& expression, std::string_view value);
+
+    // Questions to the server, about versions of a row.
+    Status ReadVersion(const LobColumn& column, const RowVersion& version, std::uint64_t offset, std::size_t most,
+                       Result& found);
+    // `follows`: a version that is not known is one if it has come of those that are.
+    Status FindLatest(const LobColumn& column, const LobRow& row, bool follows, RowVersion& latest,
+                      std::uint64_t& length);
+    Status HasWritten(const RowVersion& version, bool& written);
+    Status WhyMissing(const RowVersion& version);
+    [[nodiscard]] bool InTransaction(std::uint64_t number) const;
+
+    PgConnection& connection_;
+    const std::shared_ptr<ChunkFile> file_ = std::make_shared<ChunkFile>();
+    const std::shared_ptr<Shared> shared_;
+    std::unordered_map<RowVersion, std::weak_ptr<LobRow>, RowVersionHash> rows_;
+    std::size_t sweep_at_ = 64;
+    std::vector<Draft> drafts_;
+    std::uint64_t transaction_ = 0;       // the number of the one that runs, or ran last
+    std::uint64_t now_ = 1;
+    std::uint64_t writes_ = 0;            // into drafts
+    std::uint64_t undone_at_ = 0;
+};
+
+}  // namespace engine::postgres
