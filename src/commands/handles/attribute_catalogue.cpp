@@ -23,12 +23,13 @@ constexpr AttributeRow kCatalogue[] = {
     {"oci_attr_server", OCI_ATTR_SERVER, Shape::server, {svcctx}},
     {"oci_attr_session", OCI_ATTR_SESSION, Shape::session, {svcctx}},
     {"oci_attr_trans", OCI_ATTR_TRANS, Shape::trans, {svcctx}},
-    {"oci_attr_env", OCI_ATTR_ENV, Shape::environment, {svcctx, server, stmt, session}},
+    {"oci_attr_env", OCI_ATTR_ENV, Shape::environment,
+     {svcctx, server, stmt, session, env, error, bind, define, describe, trans, cpool, spool, lob}},
     {"oci_attr_username", OCI_ATTR_USERNAME, Shape::text, {session}},
     {"oci_attr_password", OCI_ATTR_PASSWORD, Shape::text, {session}},
     {"oci_attr_fncode", OCI_ATTR_FNCODE, Shape::ub4, {env, error}},
     {"oci_attr_object", OCI_ATTR_OBJECT, Shape::sb4, {env}},
-    {"oci_attr_nonblocking_mode", OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, {server}},
+    {"oci_attr_nonblocking_mode", OCI_ATTR_NONBLOCKING_MODE, Shape::ub1, {svcctx, server}},
     {"oci_attr_sqlcode", OCI_ATTR_SQLCODE, Shape::sb4, {error}},
     {"oci_attr_row_count", OCI_ATTR_ROW_COUNT, Shape::ub4, {stmt}},
     {"oci_attr_sqlfncode", OCI_ATTR_SQLFNCODE, Shape::ub2, {stmt}},
@@ -177,10 +178,13 @@ constexpr auto kKeywords = [] {
     return table;
 }();
 
+bool IsOf(const AttributeRow& row, int handle_type) {
+    return std::ranges::find(row.types, handle_type) != std::end(row.types);
+}
+
 Attribute AttributeOfNumber(uint32_t number, int handle_type) {
     for (const AttributeRow& row : kCatalogue)
-        if (row.number == number && std::ranges::find(row.types, handle_type) != std::end(row.types))
-            return {number, row.shape};
+        if (row.number == number && IsOf(row, handle_type)) return {number, row.shape};
     return {number, Shape::ub8};
 }
 
@@ -193,5 +197,6 @@ std::span<const AttributeRow> AttributeCatalogue() {
 Attribute DecodeAttribute(const char* word, int handle_type) {
     const int place = DecodeKeyword(word, kKeywords.data());
     if (place == kNotFound) return AttributeOfNumber(static_cast<uint32_t>(DecodeNumber(word)), handle_type);
-    return {kCatalogue[place].number, kCatalogue[place].shape};
+    const AttributeRow& row = kCatalogue[place];
+    return IsOf(row, handle_type) ? Attribute{row.number, row.shape} : AttributeOfNumber(row.number, handle_type);
 }

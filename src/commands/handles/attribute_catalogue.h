@@ -22,7 +22,7 @@ struct AttributeRow {
     const char* keyword;
     uint32_t number;
     AttributeShape shape;
-    uint8_t types[4];  // of the handles and descriptors that have it; 0 fills up
+    uint8_t types[13];  // of the handles and descriptors that have it; 0 fills up
 };
 
 // In look-up order: a typed word is the first keyword that it begins, so a keyword stands before the longer ones that
@@ -33,7 +33,7 @@ struct Attribute {
     uint32_t number;
     AttributeShape shape;
 };
-// The attribute that a word stands for. A word that begins no keyword is a decimal number; one number serves several
-// attributes, and the handle type tells which is meant. Of a number that is no attribute of the type nothing is known:
-// it is taken for an integer.
+// The attribute that a word stands for. A word that begins no keyword is a decimal number. One number serves several
+// attributes: the library gives what the handle type has, whatever the word is, so the type tells the shape. Of a number
+// that is no attribute of the type nothing is known: it is taken for an integer.
 Attribute DecodeAttribute(const char* word, int handle_type);

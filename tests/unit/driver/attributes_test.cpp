@@ -95,7 +95,8 @@ TEST(Attributes, EachKeywordFindsItsOwnNumberAndShape) {
     EXPECT_EQ(AttributeCatalogue().size(), 146u);
     EXPECT_STREQ(AttributeCatalogue().front().keyword, "oci_attr_server");
     for (const Published& row : rows) {
-        const Attribute found = DecodeAttribute(row.keyword.c_str(), 0);
+        const int type = kTypes.at(row.types.substr(0, row.types.find('+')));
+        const Attribute found = DecodeAttribute(row.keyword.c_str(), type);
         EXPECT_EQ(found.number, row.number) << row.keyword;
         EXPECT_EQ(found.shape, kShapes.at(row.shape)) << row.keyword;
     }
@@ -117,8 +118,12 @@ TEST(Attributes, EachNumberStandsForTheRowOfTheHandle) {
 
 TEST(Attributes, WordsMayBeShortenedAndNumbersNeedNotBeKnown) {
     const struct { const char* word; int type; uint32_t number; AttributeShape shape; } cases[] = {
-        {"o", 0, 6, AttributeShape::server},                     {"OCI_ATTR_PARAM", 0, 124, AttributeShape::param},
-        {"oci_attr_param_", 0, 18, AttributeShape::ub4},         {"oci_attr_is_t", 0, 130, AttributeShape::ub1},
+        {"o", OCI_HTYPE_SVCCTX, 6, AttributeShape::server},
+        {"OCI_ATTR_PARAM", OCI_HTYPE_DESCRIBE, 124, AttributeShape::param},
+        {"oci_attr_param_", OCI_HTYPE_STMT, 18, AttributeShape::ub4},
+        {"oci_attr_is_t", OCI_DTYPE_PARAM, 130, AttributeShape::ub1},
+        {"oci_attr_name", OCI_HTYPE_ERROR, 4, AttributeShape::sb4},
+        {"oci_attr_version", OCI_HTYPE_STMT, 218, AttributeShape::ub8},
         {"100", OCI_HTYPE_SESSION, 100, AttributeShape::texts},  {"308", OCI_HTYPE_SPOOL, 308, AttributeShape::ub4},
         {"308", OCI_HTYPE_SERVER, 308, AttributeShape::ub8},     {"9", OCI_HTYPE_STMT, 9, AttributeShape::ub4},
         {"9", OCI_DTYPE_PARAM, 9, AttributeShape::text},         {"x", OCI_HTYPE_STMT, 0, AttributeShape::ub8},
