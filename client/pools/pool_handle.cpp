@@ -1,6 +1,7 @@
 // Pool handles: creating and destroying, names, attributes.
 #include "pools/pool_handle.h"
 
+#include <algorithm>
 #include <atomic>
 #include <map>
 #include <utility>
@@ -112,8 +113,11 @@ std::shared_ptr<Pool> PoolHandle::Part() noexcept {
     return pool;
 }
 
+// What is opened at once has a limit: no machine holds what a negative number asks for.
 Status PoolHandle::CheckSize(const PoolSize& size) const {
-    const bool fits = size.most > 0 && size.least <= size.most && (size.step > 0 || size.least == size.most);
+    constexpr std::uint32_t kMostAtOnce = 10000;
+    const bool fits = size.most > 0 && size.least <= size.most && (size.step > 0 || size.least == size.most) &&
+                      size.least <= kMostAtOnce && std::min(size.step, size.most) <= kMostAtOnce;
     return fits ? Status() : Error(numbers_.bad_size);
 }
 

@@ -91,9 +91,11 @@ uint64_t LayOut(std::span<const ElementShape> shapes, StructMember* members) {
     return layout.RowSize();
 }
 
+// Rows without members count as a byte each: senseless numbers of them are refused, too.
 unsigned char* AllocateRows(uint64_t row_size, uint32_t array_size) {
     const bool within_reason = row_size <= UINT32_MAX;
-    return static_cast<unsigned char*>(GetMem(within_reason ? row_size * array_size + kElementSlack : SIZE_MAX));
+    const uint64_t size = std::max<uint64_t>(row_size, 1) * array_size + kElementSlack;
+    return static_cast<unsigned char*>(GetMem(within_reason ? size : SIZE_MAX));
 }
 
 void InitialiseNumbers(const MemStruct& record) {
@@ -106,8 +108,10 @@ void InitialiseNumbers(const MemStruct& record) {
 
 constexpr char kViewMark[] = "$$";
 
+// Of a long name the beginning, so that mark and index have room: cut at its end it could be the struct's own name.
 std::string ViewName(const MemStruct& record, long index) {
-    return record.name + std::string(kViewMark) + std::to_string(index);
+    const std::string ending = kViewMark + std::to_string(index);
+    return std::string(record.name).substr(0, sizeof record.name - 1 - ending.size()) + ending;
 }
 
 MemBuffer* MakeView(MemStruct& record, uint32_t index) {

@@ -12,6 +12,7 @@
 #include "core/messages.h"
 #include "core/state.h"
 #include "objects/element_access.h"
+#include "objects/memory.h"
 #include "objects/value_assignment.h"
 #include "objects/value_display.h"
 #include "objects/xids.h"
@@ -77,6 +78,7 @@ struct Setting {
     ub4 size = 0;
     bool is_password = false;
     TextArgument text;
+    Memory<char> wide;
     std::string names;
     std::vector<const char*> array;
 };
@@ -115,7 +117,7 @@ bool TakeText(Setting& setting, const char* word) {
 
 // Names joined by commas. Null pointers stand behind the last one, for a library that is told of more.
 bool TakeTexts(Setting& setting, const char* word) {
-    constexpr size_t kSpare = 64;
+    constexpr size_t kSpare = 64, kMostSpare = 1u << 20;
     setting.names = word;
     setting.array.push_back(setting.names.data());
     for (char& character : setting.names) {
@@ -123,7 +125,7 @@ bool TakeTexts(Setting& setting, const char* word) {
         character = '\0';
         setting.array.push_back(&character + 1);
     }
-    setting.array.resize(setting.array.size() + kSpare);
+    setting.array.resize(setting.array.size() + std::clamp<size_t>(setting.size, kSpare, kMostSpare));
     setting.value = setting.array.data();
     return true;
 }
@@ -254,13 +256,28 @@ void GetAttribute(const CommandRow& row, int, char** words) {
 
 // --- Setting ---------------------------------------------------------------------------------------------------------
 
+// A library that takes the value for a text reads as far as the size says: zeros stand there. False without memory, which
+// has been said.
+bool WidenArea(Setting& setting) {
+    const bool beyond = setting.size > TextArgument::kReadableText;  // only the library can say no
+    if (setting.value != setting.area || setting.size <= sizeof setting.area || beyond) return true;
+    setting.wide.reset(static_cast<char*>(GetMem(setting.size)));
+    if (setting.wide == nullptr) {
+        Message(kError, "Could not allocate memory\n");
+        return false;
+    }
+    std::memcpy(setting.wide.get(), setting.area, sizeof setting.area);
+    setting.value = setting.wide.get();
+    return true;
+}
+
 void SetAttribute(const CommandRow& row, int, char** words) {
     const AttributeHandle handle(words);
     const Attribute attribute = DecodeAttribute(words[5], handle.type);
     Setting setting;
     setting.size = DecodeCount(words[4]);
     setting.is_password = attribute.shape == Shape::text && attribute.number == OCI_ATTR_PASSWORD;
-    if (!IsNull(words[3]) && !RowOf(attribute.shape).take(setting, words[3])) return;
+    if (!IsNull(words[3]) && !(RowOf(attribute.shape).take(setting, words[3]) && WidenArea(setting))) return;
     auto* const error = ResolveError<OCIError>(words[6]);
     const sword rc = Call(&ClientLibrary::OCIAttrSet, handle.object, static_cast<ub4>(handle.type), setting.value,
                           setting.size, attribute.number, error);

@@ -77,7 +77,8 @@ protected:
 
 TEST_F(Pools, NumbersOfAPool) {
     const struct { ub4 least, most, step; sb4 answer; } cases[] = {
-        {0, 0, 0, 24413}, {2, 1, 1, 24413}, {0, 2, 0, 24413}, {1, 0, 1, 24413}, {2, 2, 0, 0}, {0, 1, 5, 0}};
+        {0, 0, 0, 24413}, {2, 1, 1, 24413}, {0, 2, 0, 24413}, {1, 0, 1, 24413}, {2, 2, 0, 0}, {0, 1, 5, 0},
+        {~0U, ~0U, 1, 24413}, {0, ~0U, ~0U, 24413}, {0, ~0U, 1, 0}};
     for (const auto& c : cases) {
         EXPECT_EQ(Create(c.least, c.most, c.step), c.answer) << c.least << ' ' << c.most << ' ' << c.step;
         if (c.answer != 0) continue;
