@@ -4,6 +4,7 @@
 // Command thread only.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <span>
@@ -92,6 +93,10 @@ uint32_t ElementSize(int type, uint32_t given, uint32_t precision);
 // Makes an element of a number type zero; those of other types stay as they are. False when that failed.
 bool SetZero(const ElementShape& shape, unsigned char* element);
 
+// A length as an element's field tells it: no more than the field holds.
+inline uint16_t FieldOfLength(uint32_t length) {
+    return static_cast<uint16_t>(std::min<uint32_t>(length, UINT16_MAX));
+}
 // How long an element is: what its length says or, where values come in pieces, the sum of what came in.
 uint32_t LengthOf(const MemBuffer& buffer, uint32_t index);
 // Pieces that came in before no longer tell how long an element is.

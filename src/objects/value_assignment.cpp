@@ -12,6 +12,7 @@
 #include "core/keywords.h"
 #include "core/messages.h"
 #include "core/state.h"
+#include "objects/buffers.h"
 #include "objects/element_access.h"
 #include "objects/library_number.h"
 #include "objects/registry.h"
@@ -317,6 +318,6 @@ bool AssignText(const ElementTarget& target, const char* word, long length) {
     }
     *target.indicator = 0;
     *target.return_code = 0;
-    *target.length = static_cast<uint16_t>(*stored);
+    *target.length = FieldOfLength(*stored);
     return true;
 }

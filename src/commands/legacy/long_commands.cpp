@@ -16,7 +16,7 @@ namespace {
 // What came in is the first element's now.
 void NoteLength(const MemBuffer& buffer, ub4 length) {
     if (!buffer.Complete()) return;
-    *buffer.Length(0) = static_cast<uint16_t>(std::min<ub4>(length, UINT16_MAX));
+    *buffer.Length(0) = FieldOfLength(length);
     *buffer.Indicator(0) = 0;
     *buffer.ReturnCode(0) = 0;
     ForgetPieces(buffer, 0);

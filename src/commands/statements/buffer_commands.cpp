@@ -133,7 +133,7 @@ void ListBuffers(const CommandRow&, int count, char** words) {
     for (MemBuffer& buffer : Buffers()) {
         if (!buffer.in_use || buffer.statement != statement) continue;
         if (name != nullptr && !HasName(buffer, name)) continue;
-        if (output && buffer.lengths != nullptr) buffer.lengths[0] = static_cast<uint16_t>(buffer.element_size);
+        if (output && buffer.lengths != nullptr) buffer.lengths[0] = FieldOfLength(buffer.element_size);
         line.Format("[%s]  %s  %d  %d  ", buffer.name, statement_name,
                     static_cast<int>(buffer.holds_pointers ? 8 : buffer.element_size), buffer.created_type);
         ListElements(line, buffer);

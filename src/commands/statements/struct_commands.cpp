@@ -120,7 +120,7 @@ void ListRow(const MemStruct& record, uint32_t row, bool utf16) {
 void SetLengthsToSizes(const MemStruct& record) {
     if (record.array_size == 0) return;
     for (const StructMember& member : record.Members())
-        *PlacesOf(record, member, 0).length = static_cast<uint16_t>(member.shape.size);
+        *PlacesOf(record, member, 0).length = FieldOfLength(member.shape.size);
 }
 
 void ListStructs(const CommandRow&, int count, char** words) {
