@@ -3,9 +3,25 @@
 
 #include "handles/environment.h"
 
+namespace {
+
+// The bytes of a text that ends at a zero, or where `length` says: a length beyond a terminated text does no harm.
+std::size_t BoundedLength(const Environment& environment, const char* text, std::size_t length) {
+    if (!environment.Utf16()) {
+        const void* zero = std::memchr(text, 0, length);
+        return zero ? static_cast<std::size_t>(static_cast<const char*>(zero) - text) : length;
+    }
+    for (std::size_t end = 0; end + 1 < length; end += 2)
+        if (text[end] == 0 && text[end + 1] == 0) return end;
+    return length;
+}
+
+}  // namespace
+
 TextIn::TextIn(const Environment& environment, const void* text, std::size_t length) {
     if (!text || length == 0) return;
-    const std::string_view given(static_cast<const char*>(text), length);
+    const auto* bytes = static_cast<const char*>(text);
+    const std::string_view given(bytes, BoundedLength(environment, bytes, length));
     if (!environment.Converts()) {
         view_ = given;
         return;
