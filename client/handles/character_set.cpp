@@ -196,6 +196,23 @@ bool FromUtf8(const CharacterSet& set, std::string_view utf8, std::string& text)
     return whole;
 }
 
+bool BeginsPair(const CharacterSet& set, std::string_view unit) noexcept {
+    return (static_cast<unsigned char>(unit[set.form == Form::utf16 ? 1 : 0]) & 0xFC) == 0xD8;
+}
+
+bool PartToUtf8(const CharacterSet& set, std::string_view part, bool last, std::string& torn, std::string& utf8) {
+    if (!IsUtf16(set)) return ToUtf8(set, part, utf8);
+    torn.append(part);
+    std::size_t taken = torn.size();
+    if (!last) {
+        taken = taken / 2 * 2;
+        if (taken > 0 && BeginsPair(set, std::string_view(torn).substr(taken - 2))) taken -= 2;
+    }
+    const bool converted = ToUtf8(set, std::string_view(torn).substr(0, taken), utf8);
+    torn.erase(0, taken);
+    return converted;
+}
+
 std::size_t Whole(const CharacterSet& set, std::string_view text, std::size_t room) noexcept {
     if (text.size() <= room) return text.size();
     switch (set.form) {

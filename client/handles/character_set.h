@@ -31,6 +31,10 @@ std::string_view Blank(const CharacterSet& set) noexcept;
 
 // Appends the whole text. False for what is no text in the set.
 bool ToUtf8(const CharacterSet& set, std::string_view text, std::string& utf8);
+// The same of a text that comes in parts: what one begins of a UTF-16 character waits in `torn` for the next.
+bool PartToUtf8(const CharacterSet& set, std::string_view part, bool last, std::string& torn, std::string& utf8);
+// Whether a unit of two bytes begins a pair.
+bool BeginsPair(const CharacterSet& set, std::string_view unit) noexcept;
 // Appends; what the set lacks becomes '?'. False when the UTF-8 is malformed: a '?' (U+FFFD in UTF-16) stands for it.
 bool FromUtf8(const CharacterSet& set, std::string_view utf8, std::string& text);
 // The length of the longest beginning that fits into `room` bytes and tears no character apart.

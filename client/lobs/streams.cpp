@@ -47,12 +47,6 @@ Status FindForm(const LobDescriptor& descriptor, const TransferArguments& argume
     return {};
 }
 
-// Whether a unit of two bytes begins a pair.
-bool BeginsPair(const CharacterSet& set, std::string_view unit) {
-    const bool low_byte_first = charset::Id(set) == OCI_UTF16ID;
-    return (static_cast<unsigned char>(unit[low_byte_first ? 1 : 0]) & 0xFC) == 0xD8;
-}
-
 // The stream that a call goes on with; none where it begins one.
 Status FindStream(Link& link, const LobDescriptor& descriptor, bool reads, std::shared_ptr<Stream>& stream) {
     if (!StreamGoesOn(link)) return {};
@@ -177,15 +171,7 @@ Status ReadThroughCallback(Stream& stream, Working& working, Link& link, const T
 Status Incoming(Stream& stream, std::string_view data, bool last, std::string& converted, std::string_view& kept) {
     kept = data;
     if (stream.form != Form::other) return {};
-    const std::string whole = stream.torn + std::string(data);
-    std::size_t taken = whole.size();
-    if (charset::IsUtf16(*stream.set) && !last) {
-        taken = whole.size() / 2 * 2;
-        if (taken > 0 && BeginsPair(*stream.set, std::string_view(whole).substr(taken - 2))) taken -= 2;
-    }
-    stream.torn = whole.substr(taken);
-    if (!charset::ToUtf8(*stream.set, std::string_view(whole).substr(0, taken), converted))
-        return Error(errors::kConversionFailed);
+    if (!charset::PartToUtf8(*stream.set, data, last, stream.torn, converted)) return Error(errors::kConversionFailed);
     kept = converted;
     return {};
 }
@@ -248,7 +234,7 @@ Status CutToAmount(const Stream& stream, const TransferArguments& arguments, std
         const std::size_t width = pairs ? 2 : 1;
         std::size_t end = 0;
         for (std::uint64_t units = 0; end + width <= data.size() && units < amount; ++units)
-            end += pairs && BeginsPair(*stream.set, data.substr(end)) ? 2 * width : width;
+            end += pairs && charset::BeginsPair(*stream.set, data.substr(end)) ? 2 * width : width;
         data = data.substr(0, end);
     }
     return {};

@@ -1,19 +1,10 @@
 // Bind handles: what the application supplies for a placeholder, or receives through one.
 #pragma once
 
-#include <string>
 #include <vector>
 
 #include "statements/data_area.h"
-
-// A value in the application's form.
-struct WholeValue {
-    std::string bytes;
-    bool is_null = true;
-    bool is_given = false;    // by the step that runs
-
-    void Forget() noexcept { bytes.clear(), is_null = true; }
-};
+#include "statements/whole_value.h"
 
 struct BindArea : DataArea {
     using DataArea::DataArea;

@@ -11,6 +11,12 @@ namespace {
 int LoadCollected(BindArea& bind, std::uint32_t element, engine::Datum& value) {
     value.kind = engine::Kind::null;
     if (element >= bind.in.size() || bind.in[element].is_null) return 0;
+    if (const engine::Lob* const object = bind.in[element].object.get()) {
+        value.kind = engine::Kind::lob;
+        value.length = 0;
+        value.data = object;
+        return 0;
+    }
     std::string_view data = bind.in[element].bytes;
     if (bind.Type()->family != values::Family::text) return values::FromWholeBytes(data, bind.workspace, value);
     if (bind.Type()->code == SQLT_STR && !bind.workspace.utf16) data = data.substr(0, data.find('\0'));

@@ -21,4 +21,5 @@ private:
     Status warning_;
     std::vector<engine::Datum> row_;        // one that goes in pieces: with its large objects read
     std::vector<std::string> contents_;     // of those, by column
+    PieceStream::Objects objects_;          // the long ones
 };

@@ -6,6 +6,7 @@
 
 #include "handles/errors.h"
 #include "platform/utf.h"
+#include "values/lob_descriptor.h"
 
 namespace {
 
@@ -25,28 +26,6 @@ void TellCode(const DataArea& area, ub4 row, const PieceBuffer& piece, int numbe
 std::size_t PieceLength(const DataArea& area, std::string_view rest, std::size_t room) {
     if (area.Type()->family != values::Family::text) return std::min(rest.size(), room);
     return values::WholeCharacters(area.workspace, rest, room);
-}
-
-// Moves the next part of `rest` into the buffer; terminated types get a zero that is not counted.
-int Move(const DataArea& area, const PieceBuffer& piece, std::string_view& rest) {
-    const std::size_t zero = area.Type()->code != SQLT_STR ? 0 : area.workspace.utf16 ? 2 : 1;
-    if (!piece.length) return errors::kBadLength;
-    if (!piece.buffer) return errors::kBadBuffer;
-    const std::size_t room = *piece.length;
-    if (room < zero) return errors::kBadLength;
-    const std::size_t taken = PieceLength(area, rest, room - zero);
-    if (taken == 0 && !rest.empty()) return errors::kBadLength;
-    auto* buffer = static_cast<char*>(piece.buffer);
-    if (taken > 0) std::memcpy(buffer, rest.data(), taken);
-    std::memset(buffer + taken, 0, zero);
-    rest.remove_prefix(taken);
-    *piece.length = static_cast<ub4>(taken);
-    return 0;
-}
-
-std::int16_t CutIndicator(std::size_t whole) {
-    constexpr std::size_t kLongest = 32767;
-    return whole <= kLongest ? static_cast<std::int16_t>(whole) : values::kLongIndicator;
 }
 
 }  // namespace
@@ -170,6 +149,7 @@ ub4 ElementsOf(const BindArea& bind) {
 Status PieceStream::StartExecute(const BoundText& text, const ExecuteArguments& arguments) {
     End();
     seen_ = live::erased_objects.load(std::memory_order_acquire);
+    collector_.Use(text.lobs ? text.lobs->store : nullptr);
     for (std::size_t placeholder = 0; placeholder < text.Count(); ++placeholder) {
         const std::shared_ptr<BindArea>& bind = text.At(placeholder);
         if (!bind || !bind->InPieces() || !bind->HasHandle()) continue;
@@ -216,15 +196,15 @@ Status PieceStream::CollectPiece(BindArea& bind, CallbackDriver& driver) {
     wanted_.area = &bind;
     const bool by_callback = wanted_.ByCallback();
     if (Status status = Place(driver); !status.Ok()) return status;
-    if (const int error = AppendPiece(bind.in[wanted_.index], bind.piece, by_callback)) return Fail(error);
+    if (const int error = AppendPiece(bind, bind.piece, by_callback)) return Fail(error);
     wanted_.asked = false;
     if (!wanted_.continued) ++wanted_.index;
     return {};
 }
 
 // A callback that goes by the iteration alone gives the same piece again when it is asked for the next one: that was all.
-int PieceStream::AppendPiece(WholeValue& whole, const PieceBuffer& place, bool by_callback) {
-    constexpr std::size_t kLongest = 0x7FFFFFFF;
+int PieceStream::AppendPiece(BindArea& bind, const PieceBuffer& place, bool by_callback) {
+    WholeValue& whole = bind.in[wanted_.index];
     const bool begins = !wanted_.continued;
     const bool is_null = SaysNull(place) || (by_callback && !place.buffer && *place.length == 0);
     if (place.code) std::memset(place.code, 0, sizeof *place.code);
@@ -239,10 +219,10 @@ int PieceStream::AppendPiece(WholeValue& whole, const PieceBuffer& place, bool b
         return 0;
     const bool begins_again = place.piece == OCI_ONE_PIECE || place.piece == OCI_FIRST_PIECE;
     if (!begins && begins_again) return errors::kIllegalOperation;
-    if (piece.size() > kLongest - whole.bytes.size()) return errors::kPiecesTooLong;
-    whole.bytes.append(piece);
+    const bool last = place.piece == OCI_ONE_PIECE || place.piece == OCI_LAST_PIECE;
+    if (const int error = collector_.Append(bind, whole, piece, begins, last)) return error;
     if (begins) begun_with_ = place.piece;
-    wanted_.continued = place.piece != OCI_ONE_PIECE && place.piece != OCI_LAST_PIECE;
+    wanted_.continued = !last;
     return 0;
 }
 
@@ -276,8 +256,8 @@ bool PieceStream::NextReturned() {
             if (wanted_.index >= bind.out.size() || !bind.HasHandle()) continue;
             const WholeValue& whole = bind.out[wanted_.index];
             is_null_ = whole.is_null;
-            rest_ = whole.bytes;
-            whole_ = rest_.size();
+            if (whole.object) value_.Start(whole.object);
+            else value_.Start(whole.bytes);
             bind.piece = {};
             wanted_.area = &bind;
             wanted_.continued = wanted_.asked = false;
@@ -308,8 +288,10 @@ void PieceStream::StartFetch(ub4 end, bool by_execute, ub4 mode) noexcept {
     wanted_.out = true;
 }
 
-void PieceStream::Begin(ub4 row, std::span<const engine::Datum> values) {
+void PieceStream::Begin(ub4 row, std::span<const engine::Datum> values, Objects* objects) {
     row_.Keep(values);
+    if (objects) objects_.swap(*objects);
+    else if (!objects_.empty()) objects_.clear();
     wanted_.iteration = row;
     define_ = 0;
 }
@@ -326,18 +308,46 @@ int PieceStream::NextValue(const Defines& defines) {
     DataArea& area = *active->area;
     const engine::Datum& value = row_[active->column];
     is_null_ = value.kind == engine::Kind::null;
-    rest_ = {};
-    int error = 0;
-    if (!is_null_) error = active->renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, rest_);
-    if (error == 0 && area.workspace.set && area.Type()->family == values::Family::text)
-        error = values::ToApplication(rest_, area.workspace, rest_);
-    if (error != 0) return error;
+    std::string_view whole;
+    if (!objects_.empty() && objects_[active->column]) {
+        value_.Start(objects_[active->column]);
+    } else {
+        int error = 0;
+        if (!is_null_) error = active->renderers[static_cast<std::size_t>(value.kind)](value, area.workspace, whole);
+        if (error == 0 && area.workspace.set && area.Type()->family == values::Family::text)
+            error = values::ToApplication(whole, area.workspace, whole);
+        if (error != 0) return error;
+        value_.Start(whole);
+    }
     ++define_;    // memory that is short leaves the value to the next call
-    whole_ = rest_.size();
     area.piece.is_set = false;
     wanted_.area = &area;
     wanted_.continued = wanted_.asked = false;
     seen_ = erased;
+    return 0;
+}
+
+// Fills the buffer from what is left of the value; terminated types get a zero that is not counted.
+int PieceStream::Move(const PieceBuffer& piece) {
+    DataArea& area = *wanted_.area;
+    const std::size_t zero = area.Type()->code != SQLT_STR ? 0 : area.workspace.utf16 ? 2 : 1;
+    if (!piece.length) return errors::kBadLength;
+    if (!piece.buffer) return errors::kBadBuffer;
+    if (*piece.length < zero) return errors::kBadLength;
+    const std::size_t room = *piece.length - zero;
+    auto* const buffer = static_cast<char*>(piece.buffer);
+    std::size_t moved = 0;
+    for (;;) {
+        if (const int error = value_.Refill(area)) return error;
+        const std::size_t part = PieceLength(area, value_.rest, room - moved);
+        if (part > 0) std::memcpy(buffer + moved, value_.rest.data(), part);
+        value_.rest.remove_prefix(part);
+        moved += part;
+        if (part == 0 || moved == room || value_.Ends()) break;
+    }
+    if (moved == 0 && !value_.Ends()) return errors::kBadLength;
+    std::memset(buffer + moved, 0, zero);
+    *piece.length = static_cast<ub4>(moved);
     return 0;
 }
 
@@ -351,15 +361,15 @@ int PieceStream::TakePiece(bool& value_ends) {
         TellCode(area, row, place, errors::kNullFetched);
         return TellIndicator(area, row, place, values::kNullIndicator) ? 0 : errors::kNullFetched;
     }
-    if (const int error = Move(area, place, rest_)) {
+    if (const int error = Move(place)) {
         if (error == errors::kBadLength && place.length && wanted_.continued && wanted_.ByCallback()) return EndCut(place);
-        value_ends = false;
+        value_ends = error != errors::kBadLength && error != errors::kBadBuffer;    // else another buffer may do
         return error;
     }
-    const bool cut = !rest_.empty() && place.piece == OCI_LAST_PIECE;
+    const bool cut = !value_.Ends() && place.piece == OCI_LAST_PIECE;
     TellCode(area, row, place, cut ? errors::kTruncated : 0);
-    TellIndicator(area, row, place, cut ? CutIndicator(whole_) : 0);
-    value_ends = rest_.empty() || cut;
+    TellIndicator(area, row, place, cut ? value_.CutIndicator() : 0);
+    value_ends = value_.Ends() || cut;
     return 0;
 }
 
@@ -368,7 +378,7 @@ int PieceStream::EndCut(const PieceBuffer& place) {
     const DataArea& area = *wanted_.area;
     *place.length = 0;
     TellCode(area, wanted_.iteration, place, errors::kTruncated);
-    TellIndicator(area, wanted_.iteration, place, CutIndicator(whole_));
+    TellIndicator(area, wanted_.iteration, place, value_.CutIndicator());
     warned_ = true;
     return place.code || area.elements.codes ? 0 : errors::kTruncated;
 }

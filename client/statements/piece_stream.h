@@ -3,7 +3,8 @@
 //
 // Going in, the application decides with ONE or LAST that a value is complete; coming out, a value goes on until it is
 // taken whole or the application says LAST. The row whose values go out is the stream's own copy, as are the values
-// that an iteration returns: whatever becomes of the query meanwhile, their bytes stay.
+// that an iteration returns: whatever becomes of the query meanwhile, their bytes stay. Large objects of more than
+// engine::kHeldWhole bytes are read as their pieces go, as long as they can be.
 //
 // While a callback runs, the statement takes no other call (Asks). What the callback takes away besides ends the
 // operation: the statement's handle, its session, a bind. A define or bind that is freed before its value comes out, or
@@ -24,6 +25,7 @@
 #include "statements/defines.h"
 #include "statements/execution.h"
 #include "statements/piece_drivers.h"
+#include "statements/whole_value.h"
 
 // A row that is kept.
 class OwnRow {
@@ -72,7 +74,9 @@ public:
 
     // Coming out: rows up to element `end`, each Begun before it is handed out.
     void StartFetch(ub4 end, bool by_execute, ub4 mode) noexcept;
-    void Begin(ub4 row, std::span<const engine::Datum> values);
+    // Large objects that are not read yet stand beside the values, one a column or null; they are taken.
+    using Objects = std::vector<std::shared_ptr<engine::Lob>>;
+    void Begin(ub4 row, std::span<const engine::Datum> values, Objects* objects);
     // Ok when the row is taken; its defines are those of `defines`.
     Status HandOut(const Defines& defines, CallbackDriver& driver);
     [[nodiscard]] ub4 Row() const { return wanted_.iteration; }
@@ -93,9 +97,10 @@ private:
     bool NextReturned();
     Status HandPieces(CallbackDriver& driver);
     // These answer an error's number or 0.
-    int AppendPiece(WholeValue& whole, const PieceBuffer& place, bool by_callback);
+    int AppendPiece(BindArea& bind, const PieceBuffer& place, bool by_callback);
     int NextValue(const Defines& defines);
     int TakePiece(bool& value_ends);
+    int Move(const PieceBuffer& place);
     int EndCut(const PieceBuffer& place);
 
     const void* const statement_;
@@ -111,10 +116,11 @@ private:
     std::size_t bind_ = 0;        // the next one to look at
     std::size_t returned_ = 0;    // elements of the iteration that come out
     ub1 begun_with_ = 0;          // the piece that the value began with, while it is the only one
+    PieceCollector collector_;
     // rows
     OwnRow row_;
-    std::size_t define_ = 0;           // the next one to look at
+    Objects objects_;             // of the row
+    std::size_t define_ = 0;      // the next one to look at
     bool is_null_ = false;
-    std::size_t whole_ = 0;       // length of the value
-    std::string_view rest_;       // what of it is still to be taken
+    OutgoingValue value_;         // what is still to be taken
 };

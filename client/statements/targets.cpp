@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "handles/errors.h"
+#include "values/lobs.h"
 
 Status Targets::FindPlaces(std::size_t columns) {
     const std::size_t count = std::min(step_.targets.size(), columns);
@@ -27,7 +28,13 @@ int Targets::Keep(const Place& place, std::uint32_t element, const engine::Datum
     whole.is_given = true;
     whole.is_null = value.kind == engine::Kind::null;
     whole.bytes.clear();
+    whole.object = nullptr;
     if (whole.is_null) return 0;
+    if (value.kind == engine::Kind::lob) {
+        const int error = values::TakeLong(value, text_.lobs.get(), whole.object);
+        if (whole.object && !OutgoingValue::Streams(bind, whole.object->Kind())) whole.object = nullptr;
+        if (error != 0 || whole.object) return error;
+    }
     std::string_view text;
     int error = place.renderers[static_cast<std::size_t>(value.kind)](value, bind.workspace, text);
     if (error == 0 && bind.Type()->family == values::Family::text)

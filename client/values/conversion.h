@@ -14,6 +14,7 @@
 #include <string_view>
 
 #include "engine/datum.h"
+#include "engine/lobs.h"
 #include "handles/character_set.h"
 #include "platform/utf.h"
 #include "values/elements.h"
@@ -40,6 +41,7 @@ struct Workspace {
     alignas(8) std::array<char, 128> small{};    // numbers, dates, row ids
     std::string text;                   // converted texts and bytes
     std::string content;                // of a large object
+    std::shared_ptr<engine::Lob> object;    // that goes in as it is
     std::shared_ptr<LobSession> lobs;   // of the session that the bind or define is used in
     std::string units;                  // text in the application's set
 

@@ -12,8 +12,8 @@ namespace values {
 // The first `most` bytes of a Datum of Kind::lob as one of text or bytes, which views `content`; `length` is that of all.
 int ReadLob(const engine::Datum& datum, LobSession* session, std::uint64_t most, std::string& content,
             engine::Datum& value, std::uint64_t& length);
-// Of a locator, all of it: 22275 for an empty one, 22927 for one of another session.
-int ReadLocator(const Located& located, const LobSession* session, std::string& content, engine::Datum& value);
+// An object of its own for one of more than kHeldWhole bytes; none for a shorter one, which is read as above.
+int TakeLong(const engine::Datum& datum, LobSession* session, std::shared_ptr<engine::Lob>& lob);
 
 constexpr std::uint64_t kWholeLob = ~std::uint64_t{0};
 

@@ -30,6 +30,7 @@ public:
         const std::size_t verb = with ? FindWord(1, {"insert", "replace", "update", "select", "delete"}) : 0;
         if (Is(verb, "insert") || Is(verb, "replace")) Insert(verb);
         else if (Is(verb, "update")) Update(verb);
+        if (with || !writes_alike_) targets_.objects.clear();
         return {};
     }
 
@@ -141,11 +142,13 @@ private:
     }
 
     void InsertValues(std::size_t at, const Columns& targets) {
-        while (Is(at, "(")) {
+        std::size_t lists = 0;
+        for (bool more = Is(at, "("); more; ++lists) {
             at = AssignList(at, targets);
-            if (!Is(at, ",")) return;
-            ++at;
+            more = Is(at, ",");
+            if (more) ++at;
         }
+        writes_alike_ = lists == 1 && (at == pieces_.size() || Is(at, ";"));
     }
 
     // The expressions of the list that opens at `open`, one a column; answers where the text goes on behind it.
@@ -196,6 +199,7 @@ private:
     void Update(std::size_t verb) {
         const std::size_t at = ReadTableName(pieces_, Is(verb + 1, "or") ? verb + 3 : verb + 1, table_);
         Set(FindWord(at, {"set"}));
+        writes_alike_ = FindWord(at, {"from", "returning"}) == pieces_.size();
     }
 
     // From SET, or a comma between assignments, on.
@@ -220,6 +224,7 @@ private:
     }
 
     void Assign(Span span, const TableColumn* target) {
+        NoteObject(span, target);
         if (!target || !target->concerned || span.Size() == 0 || IsHarmless(span, *target)) return;
         const std::size_t index = span.Size() == 1 ? ParameterOf(pieces_[span.first]) : kNoParameter;
         if (index != kNoParameter) {
@@ -229,6 +234,13 @@ private:
         const std::string quote = IsLongNumber(span) ? "'" : "";
         targets_.edits.push_back(
             {Begin(span.first), End(span.last - 1), "kelp_store(" + quote, quote + Described(*target)});
+    }
+
+    void NoteObject(Span span, const TableColumn* target) {
+        const std::size_t index = target && span.Size() == 1 ? ParameterOf(pieces_[span.first]) : kNoParameter;
+        if (index == kNoParameter) return;
+        if (const auto kind = ObjectKindOf(target->column))
+            targets_.objects.push_back({index, table_, target->name, *kind});
     }
 
     // A literal of a number with more digits than a real keeps: it is read as text.
@@ -254,6 +266,7 @@ private:
     const std::vector<std::string_view>& pieces_;
     ValueTargets& targets_;
     TableName table_;                   // that is changed
+    bool writes_alike_ = false;         // the same values into each row, and shows none
     std::deque<TableColumn> columns_;    // of it, as far as they are named
 };
 

@@ -180,6 +180,21 @@ bool ReadDeclaredType(std::string_view declared, Column& column) {
     return true;
 }
 
+std::optional<LobKind> ObjectKindOf(const Column& column) {
+    switch (column.type) {
+        case SQLT_CLOB:
+        case SQLT_DBCLOB:
+        case SQLT_LNG: return LobKind::characters;
+        case SQLT_BLOB:
+        case SQLT_LBI: return LobKind::bytes;
+        default: return std::nullopt;
+    }
+}
+
+bool IsLob(const Column& column) {
+    return ObjectKindOf(column) && column.type != SQLT_LNG && column.type != SQLT_LBI;
+}
+
 bool IsNumberType(std::uint16_t type) {
     return type == SQLT_NUM || type == SQLT_BFLOAT || type == SQLT_BDOUBLE;
 }

@@ -2,6 +2,7 @@
 // Pure functions; any thread.
 #pragma once
 
+#include <optional>
 #include <string_view>
 
 #include "engine/engine.h"
@@ -15,5 +16,9 @@ bool ReadDeclaredType(std::string_view declared, Column& column);
 // Whether values of the type are numbers; whether they are dates and times, kept as text.
 bool IsNumberType(std::uint16_t type);
 bool IsDateType(std::uint16_t type);
+
+// What a column of large objects or long values holds; none of other columns.
+std::optional<LobKind> ObjectKindOf(const Column& column);
+bool IsLob(const Column& column);    // rather than a long one
 
 }  // namespace engine::sqlite

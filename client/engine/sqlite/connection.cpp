@@ -171,6 +171,7 @@ Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint
     if (code != SQLITE_OK) return Failure(database, code);
 
     if (Status status = FindValueTargets(database, sql, made.targets); status.Failed()) return status;
+    if (utf8_) made.objects = FindObjectTargets(database, made.targets, lobs_);
     if (utf8_) made.lobs = FindLobItems(database, made.statement.get(), sql, lobs_, made.targets);
     const std::string rewritten = made.targets.Rewritten(sql);
     if (rewritten.empty()) return {};
@@ -408,6 +409,8 @@ void SqliteConnection::OnChange(void* self, int operation, const char*, const ch
     connection.lobs_.RowChanged(operation, table, row);
     if (connection.changed_table && std::strcmp(connection.changed_table->c_str(), table) == 0)
         connection.changed_row = row;
+    std::vector<std::int64_t>* const rows = connection.changed_rows;
+    if (rows && connection.changed_row == row && rows->size() < rows->capacity()) rows->push_back(row);
 }
 
 // SQLite tells the table of the statement before those of its triggers and cascades.

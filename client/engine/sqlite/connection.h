@@ -16,6 +16,7 @@
 #include "engine/sqlite/home.h"
 #include "engine/sqlite/lob_columns.h"
 #include "engine/sqlite/lob_store.h"
+#include "engine/sqlite/object_values.h"
 #include "engine/sqlite/value_targets.h"
 
 namespace engine::sqlite {
@@ -34,6 +35,7 @@ struct Compilation {
     StatementHandle statement;
     ValueTargets targets;
     std::string table;    // that it changes; those of triggers and cascades are others
+    std::vector<ObjectTarget> objects;  // placeholders whose long values may be filled in when the row stands
     std::vector<LobItem> lobs;          // of its list
     StatementHandle as_written;         // of one with lobs: what its columns are called and declared as
     Schema schema;
@@ -115,6 +117,7 @@ public:
     // The last row that was changed in a table, for whoever said which one and emptied it before.
     std::optional<std::int64_t> changed_row;
     const std::string* changed_table = nullptr;
+    std::vector<std::int64_t>* changed_rows = nullptr;    // all of them, as far as there is room
 
     // While one lives, statements may read and change the accounts.
     class Trusted {

@@ -14,18 +14,21 @@
 namespace engine::sqlite {
 namespace {
 
-bool IsLob(const Column& column) {
-    return column.type == SQLT_CLOB || column.type == SQLT_DBCLOB || column.type == SQLT_BLOB;
-}
-
 // "order by 2" means the item.
 bool OrdersByNumber(const PieceList& pieces, const ListOfTable& read) {
     const std::size_t order = FindPiece(pieces, read.list.last, {"order"});
     return std::any_of(pieces.begin() + static_cast<std::ptrdiff_t>(order), pieces.end(), IsNumber);
 }
 
-// Whether it is a table whose rows have numbers of their own, and where it lies. Throws bad_alloc.
-bool FindTable(sqlite3* database, TableName& table) {
+std::string Quoted(std::string_view name) {
+    std::string quoted = "\"";
+    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
+    return quoted += '"';
+}
+
+}  // namespace
+
+bool FindNumberedTable(sqlite3* database, TableName& table) {
     const auto has_numbers = [&](const char* schema) {
         const char* declared = nullptr;
         int key = 0;
@@ -43,11 +46,7 @@ bool FindTable(sqlite3* database, TableName& table) {
     return false;
 }
 
-std::string Quoted(std::string_view name) {
-    std::string quoted = "\"";
-    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
-    return quoted += '"';
-}
+namespace {
 
 class Rewriter {
 public:
@@ -56,7 +55,7 @@ public:
 
     // False where the items cannot be told.
     bool Rewrite(std::size_t columns) {
-        if (!FindTable(database_, read_.table)) return false;
+        if (!FindNumberedTable(database_, read_.table)) return false;
         std::size_t begin = read_.list.first;
         while (begin < read_.list.last) {
             const std::size_t end = std::min(FindPiece(pieces_, begin, {","}), read_.list.last);
@@ -86,7 +85,7 @@ private:
                                                             : name + 3 == item.last && IsWord(pieces_[name + 1], "as"));
         if ((behind && !alias) || !IsName(pieces_[name]) || (qualified && !IsTable(pieces_[item.first]))) return;
         TableColumn column;
-        if (!ReadColumn(database_, read_.table, pieces_[name], column) || !IsLob(column.column)) return;
+        if (!ReadColumn(database_, read_.table, pieces_[name], column) || !ObjectKindOf(column.column)) return;
         Note(index, column);
         edits.push_back({Begin(item.first), End(name), Number(column), {}, true});
     }
@@ -95,20 +94,24 @@ private:
         bool any = false;
         for (const TableColumn& column : InsertableColumns(database_, read_.table)) {
             if (!list.empty()) list += ", ";
-            any |= IsLob(column.column);
-            list += IsLob(column.column) ? Number(column) : Name() + '.' + Quoted(column.name);
-            if (IsLob(column.column)) Note(index_, column);
+            const bool is_object = ObjectKindOf(column.column).has_value();
+            any |= is_object;
+            list += is_object ? Number(column) : Name() + '.' + Quoted(column.name);
+            if (is_object) Note(index_, column);
             ++index_;
         }
         if (any) edits.push_back({Begin(item.first), End(item.last - 1), list, {}, true});
     }
     void Note(std::size_t index, const TableColumn& column) {
-        const LobKind kind = column.column.type == SQLT_BLOB ? LobKind::bytes : LobKind::characters;
-        items.push_back({index, store_.Column(read_.table.schema, read_.table.name, column.name, kind)});
+        items.push_back({index, store_.Column(read_.table.schema, read_.table.name, column.name, *ObjectKindOf(column.column))});
     }
-    // What is neither text nor bytes is not read where it lies.
+    // What is neither text nor bytes is not read where it lies. Nor are long values that are not very long.
     [[nodiscard]] std::string Number(const TableColumn& column) const {
         const std::string value = Name() + '.' + Quoted(column.name);
+        if (!IsLob(column.column))
+            return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) when typeof(" +
+                   value + ") = 'blob' and length(" + value + ") > " + std::to_string(kHeldWhole) + " then " + Name() +
+                   ".rowid else " + value + " end";
         return "case typeof(" + value + ") when 'null' then null when 'text' then " + Name() +
                ".rowid when 'blob' then " + Name() + ".rowid else cast(" + value + " as text) end";
     }
@@ -132,7 +135,7 @@ bool MayHaveLobs(sqlite3_stmt* compiled, bool is_query) {
     for (int index = 0; index < count; ++index) {
         Column column;
         const char* declared = sqlite3_column_decltype(compiled, index);
-        if (declared && ReadDeclaredType(declared, column) && IsLob(column)) return true;
+        if (declared && ReadDeclaredType(declared, column) && ObjectKindOf(column)) return true;
     }
     return false;
 }

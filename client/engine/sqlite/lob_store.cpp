@@ -16,7 +16,6 @@ namespace engine::sqlite {
 namespace {
 
 constexpr std::size_t kBlock = std::size_t{1} << 18;
-constexpr std::uint64_t kLongestText = std::uint64_t{8} << 20;    // that is written as one
 constexpr std::size_t kMostChanges = std::size_t{1} << 16;        // of a table
 constexpr std::uint64_t kOtherColumns = 4096;                     // of the row, beside the value
 
@@ -447,7 +446,7 @@ Status LobStore::Flush(Draft& draft) {
     Status status = code == SQLITE_OK ? Status() : Failure(database, code);
     if (status.Ok()) {
         sqlite3_bind_int64(compiled, 2, draft.row);
-        status = draft.bytes.Size() <= kLongestText ? FlushWhole(draft, compiled) : FlushInPieces(draft, compiled);
+        status = draft.bytes.Size() <= kHeldWhole ? FlushWhole(draft, compiled) : FlushInPieces(draft, compiled);
     }
     sqlite3_db_config(database, SQLITE_DBCONFIG_ENABLE_TRIGGER, 1, nullptr);
     return status;

@@ -2,7 +2,7 @@
 // written there as far as it does not grow. What grows or shrinks is collected in a draft, a file outside of the
 // database, which becomes the column's value before anything could see it: before the next statement of the connection,
 // a mark, or the commit. So it belongs to the transaction like any change. A value is never held in memory but for texts
-// of up to 8 MB; longer ones are kept as a blob, which SQLite can write in pieces.
+// of up to kHeldWhole bytes; longer ones are kept as a blob, which SQLite can write in pieces.
 //
 // A row's number alone does not tell the row: it may be deleted, and the number given to another. The store notes what
 // the connection does to rows of such tables, and what others may have done by the file's data version.
@@ -73,6 +73,7 @@ public:
 
     Status CreateTemporary(LobKind kind, std::shared_ptr<Lob>& lob) override;
     Status Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob) override;
+    [[nodiscard]] bool TakesObjects() const override { return true; }
 
     // The one column of that name.
     std::shared_ptr<const LobColumn> Column(std::string_view schema, std::string_view table, std::string_view name,

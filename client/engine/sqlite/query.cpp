@@ -42,6 +42,7 @@ SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, 
       table_(std::move(compilation.table)),
       schema_(compilation.schema),
       lobs_(std::move(compilation.lobs)),
+      objects_(connection, std::move(compilation.objects)),
       as_written_(std::move(compilation.as_written)),
       sql_(sql),
       verb_(VerbOf(sql_)),
@@ -71,6 +72,7 @@ Status SqliteQuery::FollowSchema() {
     statement_ = std::move(made.statement);
     table_ = std::move(made.table);
     lobs_ = std::move(made.lobs);
+    objects_.Use(std::move(made.objects));
     as_written_ = std::move(made.as_written);
     schema_ = made.schema;
     described_ = false;
@@ -113,7 +115,8 @@ SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
         case SQLT_LBI:
         case SQLT_BLOB: return Reading::bytes;
         case SQLT_CLOB:
-        case SQLT_DBCLOB: return Reading::characters;    // long ones are kept as blobs
+        case SQLT_DBCLOB:
+        case SQLT_LNG: return Reading::characters;    // long ones are kept as blobs
         default: return Reading::as_stored;
     }
 }
@@ -173,7 +176,7 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
             else code = sqlite3_bind_blob(statement, index, number.blob, number.length, SQLITE_TRANSIENT);
             break;
         }
-        case Kind::lob:
+        case Kind::lob: code = sqlite3_bind_zeroblob64(statement, index, objects_.LengthOf(value)); break;
         case Kind::cursor: return Error(errors::kInconsistentTypes);
     }
     return code == SQLITE_OK ? Status() : Failure(connection_.Database(), code);
@@ -182,6 +185,7 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
 Status SqliteQuery::BindRow(RowSource& source, std::uint32_t row, bool copy) {
     if (parameters_.empty()) return {};
     Status status = source.Row(row, parameters_);
+    if (status.Ok()) status = objects_.Take(parameters_, !copy);
     for (std::size_t index = 0; index < parameters_.size() && status.Ok(); ++index) {
         if (coercions_[index]) status = coercions_[index]->Apply(parameters_[index]);
         if (status.Ok()) status = Bind(static_cast<int>(index) + 1, parameters_[index], copy);
@@ -232,16 +236,56 @@ Status SqliteQuery::RunReturning(std::uint32_t row, RowSink& sink) {
     return undone.Ok() ? status : undone;
 }
 
+// Through an execution whose rows nobody wants.
+Status SqliteQuery::StepThrough() {
+    Status status;
+    for (bool has_row = true; has_row && status.Ok();) status = Step(has_row);
+    sqlite3_reset(statement_.get());
+    return status;
+}
+
+// The rows are written with room for their long values, which are filled in then.
+Status SqliteQuery::FillObjects() {
+    std::vector<std::int64_t> rows;
+    rows.reserve(ObjectValues::kMostRows);
+    connection_.changed_rows = &rows;
+    Status status = StepThrough();
+    connection_.changed_rows = nullptr;
+    if (status.Failed()) return status;
+    const auto changes = static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
+    return objects_.Fill(rows, changes);
+}
+
+// What cannot be filled in later is undone, and written whole.
+Status SqliteQuery::RunWithObjects() {
+    Status status = objects_.Detach();
+    if (status.Ok()) status = connection_.SetMark();
+    if (status.Failed()) return status;
+    try {
+        status = FillObjects();
+    } catch (const std::bad_alloc&) {
+        connection_.changed_rows = nullptr;
+        status = NoMemory();
+    }
+    if (!connection_.InTransaction()) return status;
+    if (status.Ok() && !objects_.Refused()) return connection_.DropMark();
+    Status undone = connection_.UndoToMark();
+    if (undone.Ok()) undone = connection_.DropMark();
+    if (undone.Failed() || status.Failed()) return undone.Failed() ? undone : status;
+    status = objects_.HoldWhole(parameters_);
+    for (std::size_t index = 0; index < parameters_.size() && status.Ok(); ++index)
+        status = Bind(static_cast<int>(index) + 1, parameters_[index], false);
+    return status.Ok() ? StepThrough() : status;
+}
+
 Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) {
     Status status = BindRow(source, row, false);
     if (!status.Ok()) return status;
     if (returned && sqlite3_column_count(statement_.get()) > 0) {
         status = RunReturning(row, *returned);
     } else {
-        bool has_row = true;
         const std::uint64_t told = connection_.ToldChanges();
-        while (has_row && status.Ok()) status = Step(has_row);
-        sqlite3_reset(statement_.get());
+        status = objects_.Any() ? RunWithObjects() : StepThrough();
         // "delete from t" deletes all rows at once and tells of none.
         if (verb_ == Verb::remove && connection_.ToldChanges() == told) connection_.LobsOfTables().RowsGone();
     }

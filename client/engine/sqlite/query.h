@@ -63,6 +63,9 @@ private:
     Status Bind(int index, const Datum& value, bool copy);
     Status BindDate(int index, const date::DateTime& value, bool copy);
     Status BindRow(RowSource& source, std::uint32_t row, bool copy);
+    Status StepThrough();
+    Status FillObjects();
+    Status RunWithObjects();
     Status ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected);
     Status TryRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) noexcept;
     Status RunReturning(std::uint32_t row, RowSink& sink);
@@ -96,6 +99,7 @@ private:
     std::string table_;    // that it changes
     Schema schema_;        // that it is compiled for
     std::vector<LobItem> lobs_;    // columns that come as numbers of rows
+    ObjectValues objects_;
     StatementHandle as_written_;
     std::string sql_;
     Verb verb_;

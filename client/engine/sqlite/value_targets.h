@@ -14,6 +14,7 @@
 #include "engine/engine.h"
 #include "engine/pieces.h"
 #include "engine/sqlite/coercion.h"
+#include "engine/sqlite/table_columns.h"
 #include "handles/status.h"
 
 namespace engine::sqlite {
@@ -32,7 +33,16 @@ struct ValueTargets {
         std::string after;
         bool replaces = false;
     };
+    // A placeholder that is, as it is, the value of a column of large objects or long values, in each row that the
+    // statement writes. None of statements that show what they write, or write rows of different values.
+    struct Object {
+        std::size_t index;
+        TableName table;
+        std::string column;
+        LobKind kind;
+    };
     std::vector<Parameter> parameters;
+    std::vector<Object> objects;
     std::vector<Edit> edits;    // in any order
 
     // The statement with its edits; empty when there are none.

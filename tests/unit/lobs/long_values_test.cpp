@@ -1,0 +1,200 @@
+// Values of many megabytes, in a file: put in and taken in pieces, by bind, locator and define. Whatever the way, every
+// byte comes back; and no way but those that need it holds the value in memory.
+#include <filesystem>
+#include <fstream>
+#include <string>
+
+#include "support/statement_fixture.h"
+
+namespace {
+
+constexpr std::size_t kPiece = std::size_t{1} << 20;
+
+// A text that goes on and on, with characters of two bytes that pieces of any size tear apart.
+class Endless {
+public:
+    [[nodiscard]] std::string_view At(std::uint64_t offset, std::size_t length) const {
+        return std::string_view(text_).substr(offset % kTurn.size(), length);
+    }
+
+private:
+    static constexpr std::string_view kTurn = "over and over, \xC3\xA4 turn of sixty-one bytes; \xC3\xB6 \xC3\xBC 0123456789 ";
+    std::string text_ = [] {
+        std::string text;
+        while (text.size() < kPiece + kTurn.size()) text += kTurn;
+        return text;
+    }();
+};
+
+class LongValues : public StatementTest {
+protected:
+    void SetUp() override {
+        char name[] = "/tmp/kelp-long-XXXXXX";
+        folder_ = mkdtemp(name);
+        database_ = folder_ + "/long.db";
+        StatementTest::SetUp();
+        lob = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    }
+    void TearDown() override {
+        StatementTest::TearDown();
+        std::filesystem::remove_all(folder_);
+    }
+
+    // Executes what waits for the pieces of a value, and gives them. Answers what the execute does in the end.
+    sword GivePieces(std::uint64_t length) {
+        sword rc = ExecuteCode();
+        for (std::uint64_t done = 0; rc == OCI_NEED_DATA && done < length;) {
+            dvoid* handle = nullptr;
+            ub4 type = 0, iteration = 0, index = 0;
+            ub1 direction = 0, piece = 0;
+            EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &type, &direction, &iteration, &index, &piece)), 0);
+            auto part = static_cast<ub4>(std::min<std::uint64_t>(length - done, kPiece));
+            const bool last = done + part == length;
+            piece = done == 0 ? OCI_FIRST_PIECE : last ? OCI_LAST_PIECE : OCI_NEXT_PIECE;
+            const std::string_view data = endless_.At(done, part);
+            EXPECT_EQ(Answer(OCIStmtSetPieceInfo(handle, type, err, data.data(), &part, piece, nullptr, nullptr)), 0);
+            rc = ExecuteCode();
+            done += part;
+        }
+        return rc;
+    }
+    // Fetches one value in pieces; the length of it, or where it is another than was put in.
+    std::uint64_t TakePieces(std::string_view sql, ub2 type) {
+        EXPECT_EQ(Query(sql, {InPieces(type)}, 0), 0) << sql;
+        sword rc = FetchCode();
+        std::string buffer(kPiece - 1, '\0');
+        std::uint64_t done = 0;
+        while (rc == OCI_NEED_DATA) {
+            dvoid* handle = nullptr;
+            ub4 kind = 0, iteration = 0, index = 0;
+            ub1 direction = 0, piece = 0;
+            auto length = static_cast<ub4>(buffer.size());
+            EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &kind, &direction, &iteration, &index, &piece)), 0);
+            EXPECT_EQ(Answer(OCIStmtSetPieceInfo(handle, kind, err, buffer.data(), &length, piece, nullptr, nullptr)), 0);
+            rc = FetchCode();
+            if (std::string_view(buffer).substr(0, length) != endless_.At(done, length)) return done;
+            done += length;
+        }
+        EXPECT_EQ(rc, OCI_SUCCESS) << Answer(rc);
+        return done;
+    }
+    // The same through a locator, which tells no bytes of characters beforehand.
+    std::uint64_t ReadLob(ub2 type) {
+        std::string buffer(kPiece, '\0');
+        std::uint64_t done = 0;
+        for (sword rc = OCI_NEED_DATA; rc == OCI_NEED_DATA;) {
+            oraub8 bytes = 0;
+            rc = OCILobRead2(svc, err, lob, &bytes, nullptr, 1, buffer.data(), buffer.size(), done == 0 ? OCI_FIRST_PIECE : OCI_NEXT_PIECE,
+                             nullptr, nullptr, 0, 0);
+            EXPECT_GE(rc, 0) << Answer(rc);
+            if (rc < 0 || std::string_view(buffer).substr(0, bytes) != endless_.At(done, bytes)) return done;
+            done += bytes;
+        }
+        EXPECT_TRUE(type == SQLT_CLOB || type == SQLT_BLOB);
+        return done;
+    }
+    static Area Locator(OCILobLocator*& place, ub2 type) { return {&place, -1, type}; }
+
+    Endless endless_;
+    OCILobLocator* lob = nullptr;
+    std::string folder_;
+};
+
+// Tables in which a value may be filled in when its row stands, and tables in which something looks at it before.
+TEST_F(LongValues, ComeBackWholeFromEachKindOfTable) {
+    constexpr std::uint64_t kLength = 10 * kPiece + 12345;    // more than is held in memory
+    const struct { const char *columns, *more; ub2 type, locator; } cases[] = {
+        {"k number, c clob", "", SQLT_CHR, SQLT_CLOB},
+        {"k number, c blob", "", SQLT_LBI, SQLT_BLOB},
+        {"k number, c clob, l number", "", SQLT_STR, SQLT_CLOB},
+        {"k number, c long", "", SQLT_LNG, SQLT_CLOB},
+        {"k number, c long raw", "", SQLT_BIN, SQLT_BLOB},
+        {"k number, c clob check (c like 'over%')", "", SQLT_CHR, SQLT_CLOB},
+        {"k number, c blob, n number generated always as (length(c))", "", SQLT_BIN, SQLT_BLOB},
+        {"k number, c clob", "create index first_of on t(substr(c, 1, 4))", SQLT_CHR, SQLT_CLOB},
+        {"k number, c clob", "create index all_of on t(c)", SQLT_CHR, SQLT_CLOB},
+        {"k number, c clob", "create index some_of on t(k) where c like 'over%'", SQLT_CHR, SQLT_CLOB},
+        {"k number primary key, c clob", "create trigger looks after insert on t begin update t set k = k + length(new.c) where k = new.k; end",
+         SQLT_CHR, SQLT_CLOB}};
+    MustRun("create table short(c clob)", "insert into short values('a few bytes')", "commit");
+    EXPECT_EQ(One("select c from short"), "a few bytes");
+    for (const auto& c : cases) {
+        SCOPED_TRACE(std::string(c.columns) + c.more);
+        MustRun(std::string("create table t(") + c.columns + ")");
+        if (*c.more) MustRun(c.more);
+        OCIBind* bind = nullptr;
+        ASSERT_EQ(Prepare("insert into t(k, c) values(1, :v)"), 0);
+        ASSERT_EQ(BindName(&bind, ":v", {nullptr, 0x7FFFFFFF, c.type, nullptr, nullptr, nullptr, OCI_DATA_AT_EXEC}), 0);
+        EXPECT_EQ(GivePieces(kLength), OCI_SUCCESS) << Answer(OCI_ERROR);
+        EXPECT_EQ(One("select count(*) from t"), "1");
+        MustRun("commit");
+        EXPECT_EQ(TakePieces("select c from t", c.type), kLength);
+        // From its locator into another row, which shows in the same table's other rows and nowhere else.
+        ASSERT_EQ(Query("select c from t", {Locator(lob, c.locator)}), 0);
+        ASSERT_EQ(Ready("insert into t(k, c) values(2, :v)", {Locator(lob, c.locator)}), 0);
+        EXPECT_EQ(Execute(), 0);
+        ASSERT_EQ(Ready("update t set c = :v, k = k + 10 where k > 1", {Locator(lob, c.locator)}), 0);
+        EXPECT_EQ(Execute(), 0);
+        EXPECT_EQ(TakePieces("select c from t where k > 1 order by k desc", c.type), kLength);
+        MustRun("rollback");
+        EXPECT_EQ(One("select count(*) from t"), "1");
+        EXPECT_EQ(ReadLob(c.locator), kLength);
+        MustRun("drop table t");
+    }
+}
+
+// Megabytes of freed memory that the address sanitizer keeps.
+#if defined(__SANITIZE_ADDRESS__)
+constexpr std::uint64_t kQuarantine = 512;
+#elif defined(__has_feature)
+constexpr std::uint64_t kQuarantine = __has_feature(address_sanitizer) ? 512 : 0;
+#else
+constexpr std::uint64_t kQuarantine = 0;
+#endif
+
+// The resident memory of the process: now, or the most since Forget.
+struct Memory {
+    static void Forget() { std::ofstream("/proc/self/clear_refs") << "5"; }
+    static std::uint64_t Of(std::string_view name) {
+        std::ifstream status("/proc/self/status");
+        std::string line;
+        while (std::getline(status, line))
+            if (line.starts_with(name)) return std::stoull(line.substr(name.size() + 1)) << 10;
+        ADD_FAILURE() << "no " << name;
+        return 0;
+    }
+};
+
+// Resident memory, above what the process had: the engine's page cache is in it.
+TEST_F(LongValues, NeedLittleMemory) {
+    constexpr std::uint64_t kLength = 200 * kPiece;
+    constexpr std::uint64_t kLongest = 953 * kPiece;    // the engine's limit for a row is 1000 million bytes
+    constexpr std::uint64_t kMost = std::uint64_t{64 + kQuarantine} << 20;
+    MustRun("create table t(k number, c blob)");
+    Memory::Forget();
+    const std::uint64_t before = Memory::Of("VmRSS");
+    const auto grown = [&] { return Memory::Of("VmHWM") - before; };
+
+    OCIBind* bind = nullptr;
+    ASSERT_EQ(Prepare("insert into t values(1, :v)"), 0);
+    ASSERT_EQ(BindName(&bind, ":v", {nullptr, 0x7FFFFFFF, SQLT_LBI, nullptr, nullptr, nullptr, OCI_DATA_AT_EXEC}), 0);
+    EXPECT_EQ(GivePieces(kLength), OCI_SUCCESS);
+    EXPECT_LT(grown(), kMost) << "a bind in pieces";
+    EXPECT_EQ(TakePieces("select c from t", SQLT_LBI), kLength);
+    EXPECT_LT(grown(), kMost) << "a define in pieces";
+
+    ASSERT_EQ(Query("select c from t for update", {Locator(lob, SQLT_BLOB)}), 0);
+    for (std::uint64_t done = 0; done < kLongest; done += kPiece) {
+        oraub8 bytes = 0;
+        const ub1 piece = done == 0 ? OCI_FIRST_PIECE : done + kPiece < kLongest ? OCI_NEXT_PIECE : OCI_LAST_PIECE;
+        const sword rc = OCILobWrite2(svc, err, lob, &bytes, nullptr, 1, const_cast<char*>(endless_.At(done, kPiece).data()),
+                                      kPiece, piece, nullptr, nullptr, 0, 0);
+        ASSERT_EQ(rc, piece == OCI_LAST_PIECE ? OCI_SUCCESS : OCI_NEED_DATA) << Answer(rc);
+    }
+    ASSERT_EQ(Query("select c from t for update", {Locator(lob, SQLT_BLOB)}), 0);    // what was written is stored now
+    EXPECT_EQ(ReadLob(SQLT_BLOB), kLongest);
+    EXPECT_LT(grown(), kMost) << "writes and reads in pieces";
+    MustRun("rollback");
+}
+
+}  // namespace
