@@ -88,11 +88,13 @@ void OutgoingValue::Start(std::shared_ptr<engine::Lob> object) {
     rest = {};
     whole_ = engine::kHeldWhole;
     object_ = std::move(object);
+    version_ = object_->Version();
     read_ = 0;
 }
 
 int OutgoingValue::Refill(DataArea& area) {
     if (!rest.empty() || !object_) return 0;
+    if (object_->Version() != version_) return errors::kSnapshotTooOld;    // old and new bytes are no value
     const bool has_characters = object_->Kind() == engine::LobKind::characters;
     std::uint64_t length = 0;
     std::size_t read = 0;

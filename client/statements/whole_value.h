@@ -58,5 +58,6 @@ private:
     std::size_t whole_ = 0;                 // bytes; of an object, more than an indicator tells
     std::shared_ptr<engine::Lob> object_;    // until it is read to its end
     std::uint64_t read_ = 0;
+    std::uint64_t version_ = 0;             // of the object when it was begun
     std::string block_;
 };

@@ -108,9 +108,7 @@ public:
         const auto* column = dynamic_cast<const ColumnLob*>(&other);
         return column && column->shared_ == shared_ && column->column_ == column_ && column->row_ == row_;
     }
-    [[nodiscard]] std::uint64_t Version() const override {
-        return copy_ || !shared_->store ? 0 : shared_->store->now_;
-    }
+    [[nodiscard]] std::uint64_t Version() const override;
     Status Length(std::uint64_t& bytes) override;
     Status Read(std::uint64_t offset, std::span<std::byte> out, std::size_t& read) override;
     Status CheckWrite() override;
@@ -136,6 +134,17 @@ private:
     bool is_brief_ = false;             // the query that brings it is open, and sees nobody else's changes
     std::unique_ptr<ChunkedBytes> copy_;
 };
+
+// The last time that the value may have changed.
+std::uint64_t ColumnLob::Version() const {
+    if (copy_ || !shared_->store) return 0;
+    std::uint64_t changed_at = 0;
+    if (const LobStore::Table* const table = Store().FindTable(*column_)) {
+        const auto found = table->changes.find(row_);
+        if (found != table->changes.end()) changed_at = found->second.at;
+    }
+    return std::max({changed_at, Store().floor_, Store().undone_at_});
+}
 
 // Whether the row is there and, unless the present value counts, what it was.
 Status ColumnLob::Check() {

@@ -143,6 +143,36 @@ TEST_F(LongValues, ComeBackWholeFromEachKindOfTable) {
     }
 }
 
+// A value that changes while its pieces are taken is not made up of old and new ones.
+TEST_F(LongValues, DoNotChangeBetweenPieces) {
+    MustRun("create table t(k number, c blob)", "insert into t values(1, zeroblob(20000000))", "insert into t values(2, null)");
+    OCIStmt* const query = stmt;
+    OCIStmt* const change = New<OCIStmt>(OCI_HTYPE_STMT);
+    std::string buffer(kPiece, '\0');
+    const auto take = [&] {
+        dvoid* handle = nullptr;
+        ub4 kind = 0, iteration = 0, index = 0;
+        ub1 direction = 0, piece = 0;
+        auto length = static_cast<ub4>(buffer.size());
+        EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &kind, &direction, &iteration, &index, &piece)), 0);
+        EXPECT_EQ(Answer(OCIStmtSetPieceInfo(handle, kind, err, buffer.data(), &length, piece, nullptr, nullptr)), 0);
+        return FetchCode();
+    };
+    ASSERT_EQ(Query("select c from t where k = 1 for update", {InPieces(SQLT_LBI)}, 0), 0);
+    ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
+    EXPECT_EQ(take(), OCI_NEED_DATA);
+    const auto runs = [&](const char* sql) {
+        stmt = change;
+        EXPECT_EQ(Run(sql), 0) << sql;
+        stmt = query;
+    };
+    runs("update t set c = x'00' where k = 2");
+    EXPECT_EQ(take(), OCI_NEED_DATA);
+    runs("update t set c = zeroblob(10000000) where k = 1");
+    EXPECT_EQ(Answer(take()), 22924);
+    EXPECT_EQ(FetchCode(), OCI_NO_DATA);
+}
+
 // Megabytes of freed memory that the address sanitizer keeps.
 #if defined(__SANITIZE_ADDRESS__)
 constexpr std::uint64_t kQuarantine = 512;
