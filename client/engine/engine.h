@@ -257,6 +257,9 @@ public:
     virtual Status UseSchema(std::string& schema) {
         return schema.empty() ? Status() : Error(errors::kNoSuchSchema);
     }
+    // From its next call on objects are looked for first where another connection looks; null: where nobody has asked for
+    // any.
+    virtual void PreferSchemaOf(const Connection*) noexcept {}
     virtual LobStore* Lobs() = 0;    // null where Capabilities has no lobs
 
     virtual Status Ping() = 0;

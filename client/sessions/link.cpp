@@ -122,6 +122,7 @@ std::unique_ptr<engine::Connection> Link::Exchange(std::unique_ptr<engine::Conne
     DropUsers(&LinkUser::ConnectionChanged);
     statement_cache.reset();
     next->Obey(stop_);
+    next->PreferSchemaOf(connection_.get());
     const std::lock_guard lock(cancel_mutex_);
     connection_.swap(next);
     lobs->store = connection_->Lobs();
@@ -138,6 +139,7 @@ void Link::Close() noexcept {
 void Link::GiveBack(GivingBack how) noexcept {
     const SerialLock serial(serial_);
     Connected connected = TakeApart();
+    if (connected.connection) connected.connection->PreferSchemaOf(nullptr);    // the next session has asked for none
     if (LinkPlace* place = connected.place.get()) place->TakeBack(std::move(connected), std::move(how));
 }
 

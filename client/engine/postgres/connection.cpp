@@ -45,6 +45,9 @@ Status PgConnection::Enter() {
     if (wire_->Broken()) return wire_->Lost();
     if (streaming_) streaming_->ReadAhead();
     if (wire_->Broken()) return Refused(errors::kEndOfChannel, "the connection to the server was lost");    // by this call
+    if (!path_stands_) {
+        if (Status status = SetPath(); !status.Ok()) return status;
+    }
     const bool forgets = forgotten_.size() >= kForgottenAtOnce && !in_transaction_;    // a failure would end it
     if (!forgets) return wire_->Broken() ? wire_->Lost() : Status();
     for (const std::string& command : forgotten_) wire_->Send(command.c_str());
@@ -71,7 +74,11 @@ void PgConnection::Note() noexcept {
     const PGTransactionStatusType state = wire_->Transaction();
     const bool before = std::exchange(in_transaction_, !wire_->Broken() && (state == PQTRANS_INTRANS || state == PQTRANS_INERROR));
     if (!before && in_transaction_) lobs_->TransactionBegins();
-    if (before && !in_transaction_) lobs_->Forget();
+    if (before && !in_transaction_) {
+        lobs_->Forget();
+        SomethingUndone();
+        path_may_go_ = false;
+    }
     if (!in_transaction_) savepoints_.clear();
 }
 
@@ -107,7 +114,7 @@ Status PgConnection::Settle(Guard guard, Status status) noexcept {
         wire_->Send(kDropGuard);
         wire_->Sync();
         const Status undone = wire_->Drain();
-        lobs_->Undone();
+        SomethingUndone();
         Note();
         return undone.Ok() ? status : Lose(status);
     }
@@ -305,6 +312,7 @@ Status PgConnection::UndoToMark() {
     if (mark == savepoints_.size()) return Refused(errors::kNoSuchSavepoint);
     if (Status status = Enter(); !status.Ok()) return status;
     lobs_->Forget();
+    SomethingUndone();
     Status status = wire_->Run(MarkText("rollback to savepoint", savepoints_[mark].mark).text);
     Note();
     if (!status.Ok()) return Lose(status);
@@ -375,6 +383,7 @@ Status PgConnection::CheckSavepoint(const SavepointCommand& command) {
 
 // The server has done it: what stands behind a savepoint is gone with it.
 void PgConnection::NoteSavepoint(const SavepointCommand& command) {
+    if (command.verb == SavepointCommand::Verb::undo) SomethingUndone();
     if (command.verb == SavepointCommand::Verb::set) {
         savepoints_.push_back({command.name, 0});
         return;

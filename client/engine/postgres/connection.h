@@ -58,6 +58,8 @@ public:
     Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { wire_->Obey(std::move(stop)); }
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
+    Status UseSchema(std::string& schema) override;
+    void PreferSchemaOf(const Connection* other) noexcept override;
     LobStore* Lobs() override;
     Status Ping() override;
     [[nodiscard]] bool Broken() const override { return wire_->Broken(); }
@@ -118,6 +120,8 @@ public:
     Status AskGuarded(const std::string& sql, const Wire::Values& values, Result& result);
 
 private:
+    Status SetPath();
+    void SomethingUndone() noexcept;
     [[nodiscard]] std::size_t LastMark() const noexcept;    // its place; the count of savepoints: there is none
     Status Lose(const Status& failure) noexcept;
     Status FinishPrepared(const char* verb, const Xid& xid);
@@ -137,6 +141,11 @@ private:
     std::map<Oid, std::shared_ptr<const Table>> tables_;
     std::map<Oid, Oid> base_types_;
     std::unique_ptr<PgLobStore> lobs_;
+    // The schema that is looked in first, in double quotes where it needs them; null: none but the user's own path.
+    std::shared_ptr<const std::string> schema_;
+    std::string own_path_;              // empty: not asked for yet
+    bool path_stands_ = true;           // the server has what is wanted
+    bool path_may_go_ = false;          // with the transaction, or a part of it
     PgQuery* streaming_ = nullptr;
 };
 

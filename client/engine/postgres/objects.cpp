@@ -35,22 +35,19 @@ bool ReadName(std::string_view text, std::vector<std::string>& parts) {
     }
 }
 
-// As the server has it.
-std::string StoredName(const std::string& part) {
-    if (part.starts_with('"')) return ShownName(std::string_view(part).substr(1, part.size() - 2));
-    std::string name = part;
-    for (char& c : name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
-    return name;
-}
-
 std::string Text(const Result& result, int row, int column) { return PQgetvalue(result.get(), row, column); }
 std::int64_t Integer(const Result& result, int column) {
     return std::strtoll(PQgetvalue(result.get(), 0, column), nullptr, 10);
 }
 std::string ShownText(const Result& result, int row, int column) { return ShownName(Text(result, row, column)); }
 
-void ListNames(const Result& result, std::vector<std::string>& names) {
-    for (int row = 0; row < PQntuples(result.get()); ++row) names.push_back(ShownText(result, row, 0));
+ObjectKind KindOf(char relation) {
+    switch (relation) {
+        case 'v':
+        case 'm': return ObjectKind::view;
+        case 'S': return ObjectKind::sequence;
+        default: return ObjectKind::table;
+    }
 }
 
 // The relation of that name: in the schema, or in the first one of the search path.
@@ -63,20 +60,11 @@ constexpr const char* kSequence =
     "select seqstart, seqincrement, seqmin, seqmax from pg_catalog.pg_sequence where seqrelid = $1::oid";
 constexpr const char* kSchema = "select nspname from pg_catalog.pg_namespace where nspname = $1";
 constexpr const char* kMembers =
-    "select c.relname from pg_catalog.pg_class c join pg_catalog.pg_namespace n on n.oid = c.relnamespace"
+    "select c.relname, c.relkind from pg_catalog.pg_class c join pg_catalog.pg_namespace n on n.oid = c.relnamespace"
     " where n.nspname = $1 and c.relkind in ('r', 'p', 'f', 'v', 'm', 'S') order by 1";
 constexpr const char* kDatabase = "select pg_catalog.current_database() where pg_catalog.current_database() = $1";
 constexpr const char* kSchemas =
     "select nspname from pg_catalog.pg_namespace where nspname !~ '^pg_(toast|temp)' order by 1";
-
-ObjectKind KindOf(char relation) {
-    switch (relation) {
-        case 'v':
-        case 'm': return ObjectKind::view;
-        case 'S': return ObjectKind::sequence;
-        default: return ObjectKind::table;
-    }
-}
 
 }  // namespace
 
@@ -99,7 +87,10 @@ Status PgConnection::Describe(std::string_view name, ObjectKind kind, ObjectDesc
         if (!status.Ok()) return status;
         described.kind = kind;
         described.name = ShownText(found, 0, 0);
-        ListNames(rows, described.members);
+        for (int row = 0; row < PQntuples(rows.get()); ++row) {
+            described.members.push_back(ShownText(rows, row, 0));
+            if (is_schema) described.member_kinds.push_back(KindOf(*PQgetvalue(rows.get(), row, 1)));
+        }
         object = std::move(described);
         return status;
     }

@@ -280,6 +280,13 @@ std::string ShownName(std::string_view name) {
     return upper && lower ? std::string(name) : other;
 }
 
+std::string StoredName(const std::string& part) {
+    if (part.starts_with('"')) return ShownName(std::string_view(part).substr(1, part.size() - 2));
+    std::string name = part;
+    for (char& c : name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    return name;
+}
+
 Reader BinaryReader(Oid type) {
     const TypeRow* row = Find(type);
     return row ? row->binary : nullptr;

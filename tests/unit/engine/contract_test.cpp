@@ -819,6 +819,14 @@ TEST_P(Contract, TablesAndViewsAreDescribedAsTheirRowsAre) {
     ASSERT_EQ(Answer(connection_->Describe(schema, engine::ObjectKind::schema, object)), 0);
     const std::set<std::string> members(object.members.begin(), object.members.end());
     EXPECT_EQ(members, (std::set<std::string>{"T", "W"}));
+    ASSERT_EQ(object.member_kinds.size(), 2u);
+    EXPECT_EQ(object.member_kinds[object.members[0] == "W"], engine::ObjectKind::table);
+    EXPECT_EQ(object.member_kinds[object.members[0] == "T"], engine::ObjectKind::view);
+    for (const auto& [name, number] : {std::pair{"", 0}, {"nowhere", 1435}, {schema.c_str(), 0}, {"", 0}}) {
+        std::string used = name;
+        EXPECT_EQ(Answer(connection_->UseSchema(used)), number) << name;
+        EXPECT_TRUE(number != 0 || used == schema) << used;
+    }
     const struct { const char* name; engine::ObjectKind kind; int number; } missing[] = {
         {"nowhere", engine::ObjectKind::any, 4043},     {"nowhere", engine::ObjectKind::table, 942},
         {"nowhere", engine::ObjectKind::view, 942},     {"t", engine::ObjectKind::view, 942},

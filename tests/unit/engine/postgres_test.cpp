@@ -52,6 +52,29 @@ TEST_F(Postgres, ServerThatCannotBeReached) {
     close(listener);
 }
 
+// A schema that was asked for within a transaction outlives what is undone of it, and goes with the session.
+TEST_F(Postgres, SchemaIsTheSessionsOwn) {
+    for (const char* sql : {"create schema s", "create table t(n integer)", "create table s.t(n integer)"})
+        ASSERT_EQ(Run(sql), 0) << sql;
+    ASSERT_EQ(Run("insert into s.t values(7)"), 0);
+    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    std::string schema = "s";
+    ASSERT_EQ(Answer(connection_->UseSchema(schema)), 0);
+    EXPECT_EQ(Query("select n from t"), "7;");
+    ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
+    EXPECT_EQ(Query("select n from t"), "7;");
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(Query("select n from t"), "7;");
+    std::unique_ptr<engine::Connection> other;
+    ASSERT_EQ(Answer(connection_->Another(stop_, other)), 0);
+    EXPECT_EQ(Query(*other, "select n from t"), "");
+    other->PreferSchemaOf(connection_.get());
+    EXPECT_EQ(Query(*other, "select n from t"), "7;");
+    other->PreferSchemaOf(nullptr);
+    EXPECT_EQ(Query(*other, "select n from t"), "");
+}
+
 // At each call: 3113 first, 3114 then, whatever was open; and a new logon works.
 TEST_F(Postgres, ServerThatGoesAway) {
     ASSERT_EQ(Run("create table t(n integer)"), 0);

@@ -20,14 +20,15 @@ protected:
     Pools() : CallFixture(OCI_THREADED) {}
     void SetUp() override {
         CallFixture::SetUp();
-        Folder();
+        MakeDatabase();
         pool_ = New<OCISPool>(OCI_HTYPE_SPOOL);
     }
 
-    sb4 Create(ub4 least, ub4 most, ub4 step, ub4 mode = kHomogeneous, const char* user = "ann",
+    sb4 Create(ub4 least, ub4 most, ub4 step, ub4 mode = kHomogeneous, const char* user = nullptr,
                const char* password = "secret") {
         OraText* name = nullptr;
         ub4 length = 0;
+        if (!user) user = ann_.c_str();
         const sword code = OCISessionPoolCreate(env_, err_, pool_, &name, &length, Text("work"), 4, least, most, step,
                                                 Text(user), Length(user), Text(password), Length(password), mode);
         if (code == OCI_SUCCESS) name_.assign(reinterpret_cast<char*>(name), length);
@@ -88,7 +89,7 @@ TEST_F(Pools, NumbersOfAPool) {
     }
     EXPECT_EQ(Create(0, 1, 1, 0x10), 24393);
     EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "", "secret"), 24415);
-    EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "ann", "wrong"), 1017);
+    EXPECT_EQ(Create(1, 1, 1, kHomogeneous, nullptr, "wrong"), 1017);
     EXPECT_EQ(Destroy(), 24404);
     // Steps, a surplus that goes as it comes back, and a pool that shrinks and grows.
     ASSERT_EQ(Create(1, 4, 2), 0);
@@ -162,12 +163,12 @@ TEST_F(Pools, SessionsOfSeveralUsers) {
     OCISvcCtx *svc = nullptr, *other = nullptr;
     ASSERT_EQ(Get(&svc, err_), 0) << "of the pool's own user, who becomes the database's owner";
     ASSERT_EQ(Release(svc), 0);
-    EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, User("ann", "wrong")), 1017) << "one of hers rests, but not for him";
+    EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "wrong")), 1017) << "one of hers rests, but not for him";
     ASSERT_EQ(Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT), 0);
-    ASSERT_EQ(Get(&other, err_, kSpool, nullptr, User("ann", "secret")), 0);
+    ASSERT_EQ(Get(&other, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0);
     EXPECT_EQ(OpenCount(), 2u);
     ASSERT_EQ(Release(svc), 0);
-    ASSERT_EQ(Get(&svc, err_, kSpool, nullptr, User("ann", "secret")), 0) << "the system user's makes room";
+    ASSERT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0) << "the system user's makes room";
     EXPECT_EQ(OpenCount(), 2u);
     ASSERT_EQ(Release(svc), 0);
     ASSERT_EQ(Release(other), 0);
@@ -247,7 +248,7 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     sb4 length = 0;
     const auto create = [&](const char* database, const char* password, ub4 mode) {
         return Answer(OCIConnectionPoolCreate(env_, err_, pool, &name, &length, Text(database),
-                                              static_cast<sb4>(Length(database)), 1, 1, 1, Text("ann"), 3,
+                                              static_cast<sb4>(Length(database)), 1, 1, 1, Text(ann_), Length(ann_.c_str()),
                                               Text(password), 6, mode));
     };
     EXPECT_EQ(create("/nowhere/x.db", "secret", 0), 24400);
@@ -259,7 +260,7 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     ASSERT_EQ(Answer(OCIServerAttach(server, err_, name, length, OCI_CPOOL)), 0);
     auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
     ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
-    OCISession* sessions[] = {User("ann", "secret"), User("ann", "secret")};
+    OCISession* sessions[] = {User(ann_.c_str(), "secret"), User(ann_.c_str(), "secret")};
     ub1 no_wait = 1;
     ASSERT_EQ(Answer(OCIAttrSet(pool, OCI_HTYPE_CPOOL, &no_wait, 0, OCI_ATTR_CONN_NOWAIT, err_)), 0);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[0], OCI_CRED_RDBMS, 0)), 0);

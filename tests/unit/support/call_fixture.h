@@ -6,11 +6,14 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
+#include <memory>
 #include <string>
 #include <string_view>
 
 #include "kelpci.h"
 #include "oci.h"
+#include "support/postgres_database.h"
 
 constexpr ub4 kHuge = 0xFFFFFFFF;    // a length that nobody means
 
@@ -56,6 +59,18 @@ protected:
         }
         return folder_;
     }
+
+    // A database "work", which ann may log on to: in the folder or, with KELP_TEST_ENGINE=postgres, on the server of the
+    // test run.
+    void MakeDatabase() {
+        const char* const engine = std::getenv("KELP_TEST_ENGINE");
+        const std::string ini = Folder() + "/kelpcli.ini";
+        if (!engine || std::string_view(engine) != "postgres") return;
+        server_ = std::make_unique<PostgresDatabase>();
+        ann_ = server_->Owner();
+        std::ofstream(ini) << "[work]\nurl=" << server_->Url() << '\n';
+    }
+    [[nodiscard]] bool OnServer() const { return server_ != nullptr; }
 
     void Open(ub4 mode) {
         env_ = NewEnvironment(mode);
@@ -108,8 +123,10 @@ protected:
 
     OCIEnv* env_ = nullptr;
     OCIError* err_ = nullptr;
+    std::string ann_ = "ann";
 
 private:
+    std::unique_ptr<PostgresDatabase> server_;
     ub4 mode_;
     std::string folder_;
     alignas(16) char bogus_[16] = "no such object!";
