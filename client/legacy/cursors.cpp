@@ -268,7 +268,7 @@ sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 langu
         if (!sql) return errors::kParameterMissing;
         if (length < -1 || language > 2) return errors::kParameterOutOfRange;
         const auto* const begin = reinterpret_cast<const char*>(sql);
-        const auto size = length < 0 ? std::strlen(begin) : static_cast<std::size_t>(length);
+        const std::size_t size = length < 0 ? std::strlen(begin) : strnlen(begin, static_cast<std::size_t>(length));
         return ParseText(cursor, *area, {begin, size}, deferred);
     });
 }

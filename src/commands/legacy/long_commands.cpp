@@ -83,8 +83,10 @@ void GivePiece(const CommandRow& row, int count, char** words) {
     const auto piece = static_cast<ub1>(DecodeKeywordOrNumber(words[2], PieceKeywords));
     MemBuffer* const buffer = FindDynamicBuffer(words[3], count == 6 ? DecodeLong(words[4]) : 0);
     if (buffer == nullptr || !buffer->Complete() || !AttachLengths(*buffer)) return;
+    const FirstLengths before(buffer->dynamic);
     const sword rc = Call(&ClientLibrary::osetpi, cursor.area, piece, buffer->data,
                           PieceLength(buffer->dynamic, words[count - 1]));
+    if (rc != OCI_SUCCESS) before.Restore();
     TraceAndReportAreas(row.code, words[1], CalledCursor(cursor), rc);
 }
 

@@ -200,11 +200,14 @@ void AssignTextToLob(const CommandRow&, int, char** words) {
     LobReference lob = ResolveLob(words[1]);
     TextArgument text;
     if (!text.SetWords(words + 2)) return;
+    const auto length = static_cast<sb4>(text.Length());
+    // The library reads all of it, and takes what is negative for no length.
+    if (length > sb4{TextArgument::kReadableText}) return Message(kError, "Could not allocate memory\n");
     const uint16_t type = lob.Type();
     OneRowQuery query;
     query.Prepare(type == SQLT_BLOB ? "values(cast(:1 as blob))" : "values(cast(:1 as clob))");
     query.Define(lob.place == nullptr ? &lob.locator : lob.place, sizeof lob.locator, type);
-    query.Bind(text.Text(), static_cast<sb4>(text.Length()), SQLT_CHR);
+    query.Bind(text.Text(), length, SQLT_CHR);
     const sword rc = query.Execute();
     ReturnCodeReport(DefaultErrorHandle, rc);
     if (rc == OCI_SUCCESS) Message(kOutput, "AssignTextToLob: lob %s updated.\n", words[1]);

@@ -194,7 +194,7 @@ PieceList pieces;
 
 // The bytes of a buffer's first element that its length speaks of.
 ub4 PieceLength(const MemBuffer& buffer) {
-    return buffer.Complete() ? std::min<ub4>(*buffer.Length(0), buffer.element_size) : 0;
+    return buffer.Complete() ? std::min<ub4>(LengthOf(buffer, 0), buffer.element_size) : 0;
 }
 
 size_t PieceList::LongestPiece() const {

@@ -42,7 +42,7 @@ uint16_t* ReturnCodeFor(const MemBuffer& buffer, ub4 row) {
 
 // What the buffer has for the row, as the listing of inputs counts it.
 ub4 LengthOfInput(const MemBuffer& buffer, ub4 row) {
-    return std::min<ub4>(*buffer.Length(row), buffer.element_size);
+    return std::min<ub4>(LengthOf(buffer, row), buffer.element_size);
 }
 
 // --- The list that a bind hands out ----------------------------------------------------------------------------------
@@ -182,9 +182,9 @@ void DefineDynamic(const CommandRow& row, int count, char** words) {
     auto* const error = ResolveError<OCIError>(words[2]);
     MemBuffer* const buffer = FindDynamicBuffer(words[3], has_member ? DecodeLong(words[4]) : 0);
     if (buffer == nullptr) return;
-    buffer->dynamic.lengths_count = 1;
     const bool refused = callback != nullptr && IsNull(callback);
     const sword rc = Call(&ClientLibrary::OCIDefineDynamic, define, error, buffer, refused ? nullptr : TakeDefined);
+    if (rc == OCI_SUCCESS) buffer->dynamic.lengths_count = 1;
     TraceAndReport(row.code, words[1], error, rc);
 }
 
@@ -263,12 +263,12 @@ void* ResolvePieceHandle(int type, char** words) {
 }
 
 // The place of the piece's length: what the buffer has, going in; its room, coming out, where the listing then tells
-// what was stored. Null without memory, which has been said.
+// what was stored.
 uint32_t* PieceLength(MemBuffer& buffer, bool comes_out) {
-    if (!AttachLengths(buffer)) return nullptr;
     DynamicData& dynamic = buffer.dynamic;
+    const ub4 length = comes_out ? buffer.element_size : LengthOfInput(buffer, 0);
     dynamic.previous_lengths[0] = 0;
-    dynamic.piece_lengths[0] = comes_out ? buffer.element_size : LengthOfInput(buffer, 0);
+    dynamic.piece_lengths[0] = length;
     if (comes_out) dynamic.lengths_count = 1;
     return dynamic.piece_lengths;
 }
@@ -279,14 +279,15 @@ void SetPieceInfo(const CommandRow& row, int count, char** words) {
     auto* const error = ResolveError<OCIError>(words[3]);
     const auto piece = static_cast<ub1>(DecodeKeywordOrNumber(words[4], PieceKeywords));
     MemBuffer* const buffer = FindDynamicBuffer(words[5], count == 7 ? DecodeLong(words[6]) : 0);
-    if (buffer == nullptr || !buffer->Complete()) return;
+    if (buffer == nullptr || !buffer->Complete() || !AttachLengths(*buffer)) return;
+    const FirstLengths before(buffer->dynamic);
     const bool comes_out =
         type == OCI_HTYPE_DEFINE || (handle == last_piece.handle && last_piece.direction == OCI_PARAM_OUT);
     uint32_t* const length = PieceLength(*buffer, comes_out);
-    if (length == nullptr) return;
     const sword rc = Call(&ClientLibrary::OCIStmtSetPieceInfo, handle, static_cast<ub4>(type), error,
                           DataFor(*buffer, 0), buffer->call_lengths == nullptr ? nullptr : length, piece,
                           IndicatorFor(*buffer, 0), ReturnCodeFor(*buffer, 0));
+    if (rc != OCI_SUCCESS) before.Restore();
     TraceAndReport(row.code, words[1], error, rc);
 }
 

@@ -119,6 +119,7 @@ TEST_F(LegacyCalls, TextsAreParsedAtOnceOrLater) {
     EXPECT_EQ(oparse(&cda, nullptr, -1, 0, 2), 1009);
     EXPECT_EQ(oparse(&cda, T("select 1 from dual"), -1, 0, 3), 1025);
     EXPECT_EQ(oparse(&cda, T("select 1 from dual"), -2, 0, 2), 1025);
+    EXPECT_EQ(oparse(&cda, T("select 1 from dual"), 0x7FFFFFFF, 0, 2), 0) << "its zero ends it";
     EXPECT_EQ(Parse("select n, x from t", 0), 904);
     EXPECT_EQ(cda.peo, 10);
     EXPECT_EQ(cda.v2_rc, -904);
