@@ -195,20 +195,28 @@ void UpdateType(const CommandRow&, int, char** words) {
 
 // --- Assigning a text ------------------------------------------------------------------------------------------------
 
-// A query turns the text into a LOB and fetches it into the locator.
+// Whether the recorded type is a locator's: a script may have recorded any number.
+bool IsLocatorType(uint16_t type) {
+    return type == SQLT_CLOB || type == SQLT_BLOB || type == SQLT_DBCLOB;
+}
+
+// A query turns the text into a LOB and fetches it into the locator. What it fetches under another type stays out of the
+// table.
 void AssignTextToLob(const CommandRow&, int, char** words) {
-    LobReference lob = ResolveLob(words[1]);
+    const LobReference lob = ResolveLob(words[1]);
     TextArgument text;
     if (!text.SetWords(words + 2)) return;
     const auto length = static_cast<sb4>(text.Length());
     // The library reads all of it, and takes what is negative for no length.
     if (length > sb4{TextArgument::kReadableText}) return Message(kError, "Could not allocate memory\n");
     const uint16_t type = lob.Type();
+    OCILobLocator* locator = lob.locator;
     OneRowQuery query;
     query.Prepare(type == SQLT_BLOB ? "values(cast(:1 as blob))" : "values(cast(:1 as clob))");
-    query.Define(lob.place == nullptr ? &lob.locator : lob.place, sizeof lob.locator, type);
+    query.Define(&locator, sizeof locator, type);
     query.Bind(text.Text(), length, SQLT_CHR);
     const sword rc = query.Execute();
+    if (rc == OCI_SUCCESS && lob.place != nullptr && IsLocatorType(type)) *lob.place = locator;
     ReturnCodeReport(DefaultErrorHandle, rc);
     if (rc == OCI_SUCCESS) Message(kOutput, "AssignTextToLob: lob %s updated.\n", words[1]);
 }
