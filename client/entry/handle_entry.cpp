@@ -131,6 +131,7 @@ Status MakeArray(Environment& environment, dvoid** array, TypeCode type, ub4 cou
         Destroy(whole);
         throw;
     }
+    whole->first = static_cast<const Object*>(array[0]);
     if (extra_out) *extra_out = whole->UserMemory();
     return {};
 }
@@ -185,5 +186,5 @@ sword OCIArrayDescriptorFree(dvoid** array, ub4 type) {
     const CallInFlight call;
     Object* first = Freeable(kDescriptors, array[0], type);
     auto* whole = first ? Live<DescriptorArray>(first->Parent()) : nullptr;
-    return whole ? Free(*whole) : OCI_INVALID_HANDLE;
+    return whole && whole->first == first ? Free(*whole) : OCI_INVALID_HANDLE;
 }

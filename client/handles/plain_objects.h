@@ -42,4 +42,6 @@ class DescriptorArray : public Object {
 public:
     static constexpr Kind kKind = Kind::descriptor_array;
     explicit DescriptorArray(const Origin& origin) : Object(origin) {}
+
+    const Object* first = nullptr;    // the descriptor that an application's array of them begins with; only compared
 };

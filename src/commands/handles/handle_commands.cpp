@@ -149,6 +149,16 @@ void ReleaseObject(Kind kind, const char* name, NamedObject* slot) {
     if (whole_array) FreeMem(slot->object);
 }
 
+void* PassedAs(const DescriptorReference& found, void*) {
+    return found.object;
+}
+// An array is read by the library: of a single descriptor, or of an element, it is the place that holds the pointer.
+void** PassedAs(const DescriptorReference& found, void**) {
+    if (found.slot == nullptr || found.is_array) return static_cast<void**>(found.object);
+    const bool is_element = found.object != found.slot->object;
+    return is_element ? static_cast<void**>(found.slot->object) + found.index : &found.slot->object;
+}
+
 template <class Object> void Free(const Freeing<Object>& row, int, char** words) {
     const char* const name = words[1];
     const ObjectType type = row.type_word.Decode(words[2]);
@@ -158,7 +168,7 @@ template <class Object> void Free(const Freeing<Object>& row, int, char** words)
     void* const environment = type.kind == Kind::environment ? found.object
                               : found.slot != nullptr        ? found.slot->parent
                                                              : nullptr;
-    const sword rc = Call(row.function, static_cast<Object*>(found.object), static_cast<ub4>(type.number));
+    const sword rc = Call(row.function, PassedAs(found, static_cast<Object*>(nullptr)), static_cast<ub4>(type.number));
     outputOCI(row.code, rc, name);
     EnvironmentReport(environment, rc);
     if (rc == OCI_SUCCESS && type.kind) ReleaseObject(*type.kind, name, found.slot);
