@@ -25,11 +25,13 @@ ChunkFile::~ChunkFile() {
 // Whoever gives chunks back needs no memory for it: there is room for all of them.
 Status ChunkFile::Take(std::uint32_t& chunk) {
     const std::lock_guard lock(mutex_);
-    if (file_ < 0) {
-        if (Status status = OpenTemporaryFile(file_); status.Failed()) return status;
-    }
     if (free_.empty()) {
         if (free_.capacity() <= count_) free_.reserve(std::max<std::size_t>(16, 2 * std::size_t{count_} + 1));
+        if (count_ < kInMemory) {
+            memory_[count_] = std::make_unique_for_overwrite<std::byte[]>(kChunk);
+        } else if (file_ < 0) {
+            if (Status status = OpenTemporaryFile(file_); status.Failed()) return status;
+        }
         chunk = count_++;
         return {};
     }
@@ -44,16 +46,21 @@ void ChunkFile::GiveBack(std::span<const std::uint32_t> chunks) noexcept {
     free_.insert(free_.end(), chunks.begin(), chunks.end());
     if (free_.size() < count_) return;
     free_.clear();
+    for (std::uint32_t chunk = 0; chunk < std::min(count_, kInMemory); ++chunk) memory_[chunk] = nullptr;
     count_ = 0;
-    (void)!::ftruncate(file_, 0);
+    if (file_ >= 0) (void)!::ftruncate(file_, 0);
 }
 
 Status ChunkFile::Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const {
-    return ReadTemporaryFile(file_, Place(chunk, at), out);
+    if (chunk >= kInMemory) return ReadTemporaryFile(file_, Place(chunk - kInMemory, at), out);
+    std::memcpy(out.data(), memory_[chunk].get() + at, out.size());
+    return {};
 }
 
 Status ChunkFile::Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const {
-    return WriteTemporaryFile(file_, Place(chunk, at), in);
+    if (chunk >= kInMemory) return WriteTemporaryFile(file_, Place(chunk - kInMemory, at), in);
+    std::memcpy(memory_[chunk].get() + at, in.data(), in.size());
+    return {};
 }
 
 std::size_t ChunkFile::Used() {

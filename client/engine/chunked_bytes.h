@@ -1,9 +1,11 @@
-// Bytes of any number that can be read and written anywhere: a few in memory, more in chunks of a temporary file that all
-// of a connection share. What is given up is used again, and an empty file takes no room; nor does a gap.
+// Bytes of any number that can be read and written anywhere: a few in memory, more in chunks that all of a connection
+// share: up to 32 MB of them in memory, the others in a temporary file. What is given up is used again, and an empty file
+// takes no room; nor does a gap.
 //
 // Threads: one at a time for what it holds; it may go in any thread.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -31,8 +33,11 @@ public:
     [[nodiscard]] std::size_t Used();
 
 private:
-    std::mutex mutex_;    // of all but the file's bytes
-    int file_ = -1;       // set once, by the first Take
+    static constexpr std::uint32_t kInMemory = 512;    // the first so many chunks
+
+    std::mutex mutex_;    // of all but the bytes
+    std::array<std::unique_ptr<std::byte[]>, kInMemory> memory_;
+    int file_ = -1;       // set once, when the first chunk is taken that lies there
     std::uint32_t count_ = 0;
     std::vector<std::uint32_t> free_;
 };

@@ -15,7 +15,7 @@
 namespace engine::sqlite {
 namespace {
 
-constexpr std::size_t kBlock = std::size_t{1} << 18;
+constexpr std::size_t kBlock = std::size_t{1} << 17;
 constexpr std::size_t kMostChanges = std::size_t{1} << 16;        // of a table
 constexpr std::uint64_t kOtherColumns = 4096;                     // of the row, beside the value
 
