@@ -16,6 +16,7 @@ struct Dialect {
         std::string_view written;    // a word of the application's, lower case; several words with one blank between
         std::string_view engine;     // what the engine knows for it
         bool drops_size = false;     // of a type: what stands in parentheses behind it is left out
+        std::string_view sizes = {};     // of an interval: what stands for the sizes that are not told, "2" or "2,6"
     };
     std::string (*placeholder)(std::size_t number);    // from 1: ?1, $1
     std::span<const Spelling> types;         // replaced as whole words in definition statements and casts

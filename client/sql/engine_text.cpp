@@ -302,7 +302,9 @@ private:
             if (matched == 0) continue;
             end = index + matched;
             std::string replacement(spelling.engine);
-            if (matched > 1 && IsSize(index + 1)) replacement.append("(").append(tokens_[index + 2].text).append(")");
+            if (!spelling.sizes.empty()) {
+                replacement.append("(").append(IntervalSizes(index, spelling.sizes, end)).append(")");
+            } else if (matched > 1 && IsSize(index + 1)) replacement.append("(").append(tokens_[index + 2].text).append(")");
             if (spelling.drops_size) end = BehindSize(end);
             Replace(tokens_[index], tokens_[end - 1].End(), replacement);
             break;
@@ -311,6 +313,18 @@ private:
         if (CountsCharacters(end)) Insert(tokens_[end - 1].End(), dialect_.counts_characters);
         type_end_ = end;    // where the size in parentheses may follow
         return end;
+    }
+
+    // The sizes of an interval's type, which stand behind its second word and its last; `end` goes behind the latter.
+    std::string IntervalSizes(std::size_t index, std::string_view defaults, std::size_t& end) const {
+        const std::size_t comma = std::min(defaults.find(','), defaults.size());
+        std::string leading(defaults.substr(0, comma)), fraction(defaults.substr(comma));
+        if (IsSize(index + 2)) leading = tokens_[index + 3].text;
+        if (!fraction.empty() && IsSize(end)) {
+            fraction = "," + std::string(tokens_[end + 1].text);
+            end += 3;
+        }
+        return leading + fraction;
     }
 
     // Behind what stands in parentheses at `index`, if anything does.
@@ -326,13 +340,13 @@ private:
         return holds_number && At(tokens_, index).Is("(") && At(tokens_, index + 2).Is(")");
     }
 
-    // How many tokens the words of `written` are at `index`; 0 when they are not there. A size may stand behind the
-    // first of several words: timestamp(3) with time zone.
+    // How many tokens the words of `written` are at `index`; 0 when they are not there. A size may stand behind any
+    // but the last word: timestamp(3) with time zone.
     std::size_t MatchWords(std::size_t index, std::string_view written) const {
         std::size_t count = 0;
         while (!written.empty()) {
             const std::size_t length = std::min(written.find(' '), written.size());
-            if (count == 1 && IsSize(index + 1)) count += 3;
+            if (count > 0 && IsSize(index + count)) count += 3;
             if (!At(tokens_, index + count).Is(written.substr(0, length))) return 0;
             written.remove_prefix(std::min(length + 1, written.size()));
             ++count;

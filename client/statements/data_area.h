@@ -85,7 +85,8 @@ public:
     [[nodiscard]] const values::ExternalType* Type() const { return type_; }
     // Whether elements are descriptors of dates, times or intervals.
     [[nodiscard]] bool IsDatetime() const {
-        return type_ && type_->family == values::Family::date && type_->is_pointer;
+        if (!type_) return false;
+        return (type_->family == values::Family::date && type_->is_pointer) || type_->family == values::Family::interval;
     }
     [[nodiscard]] bool InPieces() const { return in_pieces_; }
     [[nodiscard]] const Callbacks& AsksBy() const { return callbacks_; }

@@ -91,7 +91,7 @@ using ByOrigin = std::array<Function, kKinds + 4>;
 template <class Function>
 using ByKind = std::array<Function, kKinds>;
 
-enum class Family : std::uint8_t { text, bytes, number, integer, real, date, row_id, cursor, lob };
+enum class Family : std::uint8_t { text, bytes, number, integer, real, date, interval, row_id, cursor, lob };
 
 struct ExternalType {
     std::uint16_t code;

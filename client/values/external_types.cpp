@@ -54,6 +54,8 @@ const ExternalType kTypes[] = {
     {SQLT_TIMESTAMP, Family::date, kPointer, false, true, FromDatetime, &kToDatetime, nullptr},
     {SQLT_TIMESTAMP_TZ, Family::date, kPointer, false, true, FromDatetime, &kToDatetime, nullptr},
     {SQLT_TIMESTAMP_LTZ, Family::date, kPointer, false, true, FromDatetime, &kToDatetime, nullptr},
+    {SQLT_INTERVAL_YM, Family::interval, kPointer, false, true, FromYearMonth, &kToYearMonth, nullptr},
+    {SQLT_INTERVAL_DS, Family::interval, kPointer, false, true, FromDaySecond, &kToDaySecond, nullptr},
 };
 
 constexpr ExternalType kMachineFloat{SQLT_BFLOAT, Family::real, 4, false, false, FromFlt, &kToFlt, nullptr};
@@ -140,7 +142,8 @@ int FindType(std::uint16_t code, std::int64_t size, bool may_be_null, const Exte
 
 engine::Kind KindOf(const ExternalType& type, std::uint32_t size) {
     switch (type.family) {
-        case Family::text: return engine::Kind::text;
+        case Family::text:
+        case Family::interval: return engine::Kind::text;
         case Family::bytes: return engine::Kind::bytes;
         case Family::number: return engine::Kind::decimal;
         case Family::integer:

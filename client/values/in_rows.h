@@ -25,6 +25,8 @@ int FromRid(const Source&, Workspace&, engine::Datum&);
 int FromString(const Source&, Workspace&, engine::Datum&);      // OCIString*
 int FromRaw(const Source&, Workspace&, engine::Datum&);         // OCIRaw*
 int FromDatetime(const Source&, Workspace&, engine::Datum&);    // OCIDateTime*
+int FromYearMonth(const Source&, Workspace&, engine::Datum&);   // OCIInterval*
+int FromDaySecond(const Source&, Workspace&, engine::Datum&);
 int FromRdd(const Source&, Workspace&, engine::Datum&);         // OCIRowid*
 int FromClob(const Source&, Workspace&, engine::Datum&);        // OCILobLocator*
 int FromBlob(const Source&, Workspace&, engine::Datum&);

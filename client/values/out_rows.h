@@ -11,6 +11,7 @@ extern const ByOrigin<OutConverter> kToBin, kToVbi, kToRaw;                     
 extern const ByOrigin<OutConverter> kToNum, kToPdn, kToDecimal64, kToDecimal128;                  // numbers
 extern const ByOrigin<OutConverter> kToInt, kToUin, kToFlt;
 extern const ByOrigin<OutConverter> kToDat, kToOdt, kToDatetime;                                  // dates
+extern const ByOrigin<OutConverter> kToYearMonth, kToDaySecond;                                   // intervals
 extern const ByOrigin<OutConverter> kToRid, kToRdd;                                               // row ids
 extern const ByOrigin<OutConverter> kToClob, kToDbclob, kToBlob;                                  // locators
 extern const ByOrigin<OutConverter> kToNothing;                                                   // no conversion: 932

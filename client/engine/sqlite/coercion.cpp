@@ -2,10 +2,12 @@
 #include "engine/sqlite/coercion.h"
 
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <cstring>
 
 #include "date/format.h"
+#include "date/interval.h"
 #include "engine/sqlite/characters.h"
 #include "engine/sqlite/column_types.h"
 #include "handles/errors.h"
@@ -90,6 +92,12 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
     return date::FromText(text, model, date::kEnglish, is_date ? date::Scope::date : date::Scope::timestamp, &value);
 }
 
+bool NanosecondsOf(const date::Interval& interval, std::int64_t& nanoseconds) {
+    constexpr std::int64_t kSecond = 1000000000;
+    return !__builtin_mul_overflow(interval.whole, kSecond, &nanoseconds) &&
+           !__builtin_add_overflow(nanoseconds, std::int64_t{interval.nanosecond}, &nanoseconds);
+}
+
 }  // namespace
 
 // Without limits nothing is refused for its size.
@@ -97,14 +105,14 @@ Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)),
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) column_.scale = kFloating;
     if (purpose == Purpose::store) return;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) column_.type = SQLT_NUM;
-    if (IsDateType(column_.type)) return;
+    if (IsDateType(column_.type) || IsIntervalType(column_.type)) return;
     column_.size = column_.characters = 0;
     column_.precision = 0;
     column_.scale = kFloating;
 }
 
 bool Coercion::ConcernsComparison(const Column& column) {
-    return IsDateType(column.type) || IsNumberType(column.type) || column.type == SQLT_AFC || column.type == SQLT_BIN;
+    return IsDateType(column.type) || IsIntervalType(column.type) || IsNumberType(column.type) || column.type == SQLT_AFC || column.type == SQLT_BIN;
 }
 
 bool Coercion::Concerns(const Column& column) {
@@ -126,6 +134,7 @@ Status Coercion::Apply(Datum& value) {
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) return ApplyBinary(value);
     if (IsNumberType(column_.type)) return ApplyNumber(value);
     if (IsDateType(column_.type)) return ApplyDate(value);
+    if (IsIntervalType(column_.type)) return ApplyInterval(value);
     if (column_.type == SQLT_BIN) return ApplyBytes(value);
     return ApplyText(value);
 }
@@ -259,6 +268,33 @@ Status Coercion::ApplyDate(Datum& value) {
     if (failure != 0) return Refuse(failure);
     if ((column_.type == SQLT_DAT || column_.type == SQLT_TIMESTAMP) && (stores || !is_date)) read.has_zone = false;
     SetDate(read, value);
+    return {};
+}
+
+// Only what is stored is rounded to the column's digits, and must not have more of them before.
+Status Coercion::ApplyInterval(Datum& value) {
+    if (value.kind != Kind::text) return Refuse(errors::kInconsistentTypes);
+    if (value.length == 0) {
+        value = {};
+        return {};
+    }
+    date::Interval read;
+    const bool of_months = column_.type == SQLT_INTERVAL_YM;
+    int failure = date::FromText(value.Text(), of_months ? date::Span::year_month : date::Span::day_second, &read);
+    if (failure == 0 && purpose_ == Purpose::store) {
+        std::array<char, date::kMaxIntervalText> text;
+        std::size_t length = 0;
+        const int digits = of_months ? 0 : column_.scale;
+        failure = date::RoundFraction(read, digits, &read);
+        if (failure == 0)
+            failure = date::ToText(read, column_.precision, static_cast<unsigned>(digits), text.data(), &length);
+    }
+    if (failure != 0) return Refuse(failure);
+    std::int64_t kept = read.whole;
+    if (!of_months && !NanosecondsOf(read, kept)) return Refuse(errors::kLeadingPrecision);
+    value.kind = Kind::integer;
+    value.length = 0;
+    value.integer = kept;
     return {};
 }
 

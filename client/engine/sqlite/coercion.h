@@ -34,6 +34,7 @@ private:
     Status ApplyText(Datum& value);
     Status ApplyBytes(Datum& value);
     Status ApplyDate(Datum& value);
+    Status ApplyInterval(Datum& value);
     void SetDate(const date::DateTime& date, Datum& value);    // in the text form that dates have in a file
     Status ApplySize(const Datum& value);
     [[nodiscard]] Status Refuse(int number) const;

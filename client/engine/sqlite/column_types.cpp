@@ -83,6 +83,8 @@ constexpr TypeRow kTypes[] = {
     {"timestamp with local time zone", SQLT_TIMESTAMP_LTZ, Measure::fraction, kTimestampSize, 0, 6},
     {"timestamp", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
     {"time", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
+    {"span_ym", SQLT_INTERVAL_YM, Measure::digits, 5, 2, 0},
+    {"span_ds", SQLT_INTERVAL_DS, Measure::digits, 11, 2, 6},
     {"clob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0},
     {"nclob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0, true},
     {"dbclob", SQLT_DBCLOB, Measure::none, kLocatorSize, 0, 0},
@@ -202,5 +204,7 @@ bool IsNumberType(std::uint16_t type) {
 bool IsDateType(std::uint16_t type) {
     return type == SQLT_DAT || type == SQLT_TIMESTAMP || type == SQLT_TIMESTAMP_TZ || type == SQLT_TIMESTAMP_LTZ;
 }
+
+bool IsIntervalType(std::uint16_t type) { return type == SQLT_INTERVAL_YM || type == SQLT_INTERVAL_DS; }
 
 }  // namespace engine::sqlite

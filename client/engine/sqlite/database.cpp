@@ -22,6 +22,8 @@ constexpr Dialect::Spelling kTypes[] = {
     {"long", "long varchar"},
     {"timestamp with local time zone", "timestamp_ltz"},
     {"timestamp with time zone", "timestamp_tz"},
+    {"interval year to month", "span_ym", false, "2"},
+    {"interval day to second", "span_ds", false, "2,6"},
 };
 
 std::string Placeholder(std::size_t number) { return '?' + std::to_string(number); }

@@ -108,6 +108,7 @@ void SqliteQuery::Describe() {
 SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
     if (IsNumberType(column.type)) return Reading::number;
     if (IsDateType(column.type)) return Reading::date;
+    if (IsIntervalType(column.type)) return Reading::interval;
     switch (column.type) {
         case SQLT_RDD: return Reading::row_id;
         case SQLT_AFC: return column.size > 0 ? Reading::padded : Reading::as_stored;

@@ -47,7 +47,7 @@ private:
         drained      // the rows to come are in store_, with end_ behind them
     };
     // How a value of a column is handed out.
-    enum class Reading : std::uint8_t { as_stored, number, padded, date, row_id, bytes, characters, lob };
+    enum class Reading : std::uint8_t { as_stored, number, padded, date, row_id, bytes, characters, lob, interval };
     // Room for a column's value that SQLite keeps in another form.
     struct Room {
         OCINumber number;
@@ -93,6 +93,7 @@ private:
     void PlanReading();
     void DescribeFromRow();
     [[nodiscard]] int Recompilations() const;
+    void FillInterval(int index, Datum& value);
 
     SqliteConnection& connection_;
     StatementHandle statement_;

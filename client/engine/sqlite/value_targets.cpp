@@ -82,6 +82,7 @@ Status Convert(std::string_view text, const Column& column, Coercion::Purpose pu
     if (Status status = coercion.Apply(value); status.Failed()) return status;
     switch (value.kind) {
         case Kind::null: literal = "null"; break;
+        case Kind::integer: literal = std::to_string(value.integer); break;
         case Kind::decimal: return NumberLiteral(*static_cast<const OCINumber*>(value.data), literal);
         case Kind::bytes: literal = BlobLiteral(value.data, value.length); break;
         case Kind::real: {
