@@ -92,9 +92,24 @@ void Rebuild(Writer& writer) {
     writer.tables.push_back(std::move(owned));
 }
 
+// Under the writer's mutex.
+void CountErased() {
+    erased_objects.store(erased_objects.load(std::memory_order_relaxed) + 1, std::memory_order_release);
+}
+
 }  // namespace
 
 constinit std::atomic<const Table*> current{&kNoObjects};
+constinit std::atomic<std::uint64_t> erased_objects{0};
+[[gnu::tls_model("initial-exec")]] constinit thread_local Found last_found[kRemembered];
+
+// Counts before it looks: what is erased meanwhile is not remembered for long.
+bool FindAndRemember(const void* pointer, Kind kind) noexcept {
+    const std::uint64_t erased = erased_objects.load(std::memory_order_acquire);
+    if (Find(pointer) != kind) return false;
+    last_found[RememberedAt(kind)] = {pointer, erased};
+    return true;
+}
 
 void Insert(const void* pointer, Kind kind) {
     Writer& writer = TheWriter();
@@ -109,7 +124,9 @@ void Retype(const void* pointer, Kind kind) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
     Slot* slot = FindSlot(writer.InUse(), pointer);
-    if (slot) slot->store(AddressOf(pointer) << kKindBits | static_cast<Word>(kind), std::memory_order_release);
+    if (!slot) return;
+    slot->store(AddressOf(pointer) << kKindBits | static_cast<Word>(kind), std::memory_order_release);
+    CountErased();
 }
 
 bool Contains(const void* pointer) noexcept {
@@ -123,8 +140,6 @@ std::size_t TableCount() noexcept {
     return TheWriter().tables.size();
 }
 
-constinit std::atomic<std::uint64_t> erased_objects{0};
-
 bool Erase(const void* pointer) noexcept {
     Writer& writer = TheWriter();
     const std::lock_guard lock(writer.mutex);
@@ -132,7 +147,7 @@ bool Erase(const void* pointer) noexcept {
     Slot* slot = FindSlot(table, pointer);
     if (!slot) return false;
     slot->store(kErased, std::memory_order_release);
-    erased_objects.store(erased_objects.load(std::memory_order_relaxed) + 1, std::memory_order_release);
+    CountErased();
     --writer.living;
     auto index = static_cast<std::size_t>(slot - table.slots);
     if (table.slots[table.Next(index)].load(std::memory_order_relaxed) != kEmpty) return true;

@@ -69,11 +69,39 @@ inline Kind KindOf(const void* pointer) noexcept {
     return Find(pointer);
 }
 
+// Goes up with each object that is erased or gets another kind, before the eraser's barrier: who has found some living
+// need not look again while it stands.
+extern constinit std::atomic<std::uint64_t> erased_objects;
+
+// What a thread found last of a kind that nearly all calls ask for, and erased_objects before it looked. While that
+// stands the object is in the set, and reading it is as good as reading the set: the proof in in_flight.h holds for it.
+struct Found {
+    const void* pointer = nullptr;
+    std::uint64_t erased = ~std::uint64_t{0};    // that it never is: nothing found yet
+};
+constexpr int kRemembered = 3;
+constexpr int RememberedAt(Kind kind) {    // -1: it is not
+    return kind == Kind::error ? 0 : kind == Kind::statement ? 1 : kind == Kind::service_context ? 2 : -1;
+}
+[[gnu::tls_model("initial-exec")]] extern constinit thread_local Found last_found[kRemembered];
+bool FindAndRemember(const void* pointer, Kind kind) noexcept;
+
+// Whether it is a living object of that kind.
+template <Kind kind>
+[[gnu::always_inline]] inline bool Is(const void* pointer) noexcept {
+    if constexpr (constexpr int at = RememberedAt(kind); at < 0) {
+        return KindOf(pointer) == kind;
+    } else {
+        if (in_flight::Closed()) return KindOf(pointer) == kind;
+        const Found& last = last_found[at];
+        const bool stands = last.pointer == pointer && last.erased == erased_objects.load(std::memory_order_acquire);
+        return stands || FindAndRemember(pointer, kind);
+    }
+}
+
 // The object must not be in the set. Throws std::bad_alloc and changes nothing then.
 void Insert(const void* pointer, Kind kind);
 bool Erase(const void* pointer) noexcept;    // false when it is not in the set
-// Goes up with each object that is erased: who has found some living need not look again while it stands.
-extern constinit std::atomic<std::uint64_t> erased_objects;
 // Nothing for an object that another thread has erased. As Kind::none an object stays in the set, but is not found.
 void Retype(const void* pointer, Kind kind) noexcept;
 bool Contains(const void* pointer) noexcept;    // of any kind, Kind::none too

@@ -22,10 +22,16 @@ TEST(Live, KnowsWholeAddressesOnly) {
         EXPECT_EQ(live::KindOf(reinterpret_cast<const void*>(bits ^ change)), Kind::none) << std::hex << change;
     for (const std::uintptr_t odd : {0ULL, 1ULL, ~0ULL, ~0ULL << 4, ~0ULL >> 4, ~0ULL >> 4 << 4})
         EXPECT_EQ(live::KindOf(reinterpret_cast<const void*>(odd)), Kind::none) << std::hex << odd;
+    EXPECT_TRUE(live::Is<Kind::statement>(object));
     live::Retype(object, Kind::none);
+    EXPECT_FALSE(live::Is<Kind::statement>(object)) << "what was found last is not remembered any more";
     EXPECT_EQ(live::KindOf(object), Kind::none);
     EXPECT_TRUE(live::Contains(object));
+    live::Retype(object, Kind::statement);
+    EXPECT_TRUE(live::Is<Kind::statement>(object));
+    EXPECT_FALSE(live::Is<Kind::statement>(nullptr));
     EXPECT_TRUE(live::Erase(object));
+    EXPECT_FALSE(live::Is<Kind::statement>(object));
     EXPECT_FALSE(live::Contains(object));
     EXPECT_FALSE(live::Erase(object));
     live::Retype(object, Kind::statement);
@@ -57,6 +63,7 @@ TEST(Live, ASlotThatChangesHandsNeverAnswersTheOthersKind) {
             const CallInFlight call;
             const Kind kind = live::KindOf(first);
             wrong += kind != Kind::none && kind != Kind::error;
+            wrong += live::Is<Kind::error>(first) && live::Is<Kind::error>(second);
         }
     }
     stop = true;
