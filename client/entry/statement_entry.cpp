@@ -109,6 +109,7 @@ sword OCIStmtExecute(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, ub4 iters, ub
     });
 }
 
+// Flat: with the gate in line, for it runs for every value that goes in pieces.
 [[gnu::flatten]] sword OCIStmtFetch(OCIStmt* stmt, OCIError* err, ub4 rows, ub2 orientation, ub4 mode) {
     return Fetch(stmt, err, rows, orientation, 0, mode);
 }

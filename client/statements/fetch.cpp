@@ -19,7 +19,8 @@ Status Statement::CheckFetch() {
     return run_.cursor.IsOpen() ? Status() : Error(errors::kFetchOutOfSequence);
 }
 
-// What the engine had to say waits for the end of a fetch that goes on.
+// What the engine had to say waits for the end of a fetch that goes on. Flat: what it calls here is in line, for it runs
+// for every value that goes in pieces.
 [[gnu::flatten]] Status Statement::Fetch(ErrorHandle& error, ub4 rows, ub2 orientation, sb4 offset) {
     const PieceStream::Use wants = pieces_.Wants();
     const bool goes_on = wants == PieceStream::Use::fetch || wants == PieceStream::Use::fetch_by_execute;

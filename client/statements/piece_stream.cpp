@@ -401,6 +401,7 @@ Status PieceStream::HandPieces(CallbackDriver& driver) {
     return {};
 }
 
+// Flat: what it calls here is in line, for it runs for every value.
 [[gnu::flatten]] Status PieceStream::HandOut(const Defines& defines, CallbackDriver& driver) {
     for (;;) {
         if (!wanted_.area) {
