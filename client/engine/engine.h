@@ -261,6 +261,9 @@ public:
     // any.
     virtual void PreferSchemaOf(const Connection*) noexcept {}
     virtual LobStore* Lobs() = 0;    // null where Capabilities has no lobs
+    // Whether statements from now on wait for what other sessions have locked, as they do at first, before they answer
+    // 54; else they answer it at once.
+    virtual void WaitForLocks(bool waits) noexcept = 0;
 
     virtual Status Ping() = 0;
     // The connection is lost (3113 or 3114 was the answer): nothing but destroying it is of use.

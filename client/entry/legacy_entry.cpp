@@ -1,8 +1,9 @@
 // The version-7 calls. Their gate is legacy/call.h: areas take the place of handles.
 #include <string_view>
 
-#include "handles/gate.h"
+#include "legacy/bridges.h"
 #include "legacy/cursors.h"
+#include "legacy/options.h"
 #include "legacy/logins.h"
 #include "oci_legacy.h"
 #include "sessions/service_context.h"
@@ -36,6 +37,14 @@ sword oexec(Cda_Def* cursor) { return legacy::Execute(cursor); }
 sword oexn(Cda_Def* cursor, sword iters, sword rowoff) { return legacy::ExecuteRows(cursor, iters, rowoff); }
 sword ofetch(Cda_Def* cursor) { return legacy::Fetch(cursor, 1); }
 sword ofen(Cda_Def* cursor, sword rows) { return legacy::Fetch(cursor, rows); }
+sword oopt(Cda_Def* cursor, sword rollbackOption, sword waitOption) {
+    return legacy::SetOptions(cursor, rollbackOption, waitOption);
+}
+
+sword oflng(Cda_Def* cursor, sword pos, ub1* buf, sb4 bufLen, sword type, ub4* retLen, sb4 offset) {
+    return legacy::ReadPart(cursor, pos, {buf, bufLen, type, retLen, offset});
+}
+
 sword ocan(Cda_Def* cursor) { return legacy::Cancel(cursor); }
 
 sword odescr(Cda_Def* cursor, sword pos, sb4* dbSize, sb2* dbType, sb1* name, sb4* nameLen, sb4* dispSize, sb2* prec,
@@ -97,6 +106,16 @@ sword osetpi(Cda_Def* cursor, ub1 piece, dvoid* buf, ub4* len) { return legacy::
 sword odessp(Lda_Def* lda, text* object, size_t, ub1*, size_t, ub1*, size_t, ub2*, ub2*, ub2*, text**, ub2*, ub2*, ub1*,
              ub1*, ub4*, sb2*, sb2*, ub1*, ub4*, ub4* arraySize) {
     return legacy::DescribeProcedure(lda, object, arraySize);
+}
+
+// Takes the locks that it needs itself: the session is lent under its own.
+sword OCISvcCtxToLda(OCISvcCtx* svc, OCIError* err, Lda_Def* lda) {
+    return EnterUnlocked<ServiceContext>(svc, err,
+                                         [lda](ServiceContext& service) { return legacy::LendTo(lda, service); });
+}
+
+sword OCILdaToSvcCtx(OCISvcCtx** svcOut, OCIError* err, Lda_Def* lda) {
+    return EnterError(err, [&](ErrorHandle& error) { return legacy::BringBack(lda, svcOut, error); });
 }
 
 void sqllda(Lda_Def* lda) { sqlld2(lda, nullptr, nullptr); }

@@ -103,7 +103,7 @@ Status BeginSession(ServiceContext& service, Session& session, ub4 kind, ub4 mod
 Status ChangePasswordAndLogOn(ServiceContext& service, const std::string& user, const std::string& old_password,
                               const std::string& new_password) {
     Server* server = nullptr;
-    Status status = service.RequireServer(server);
+    Status status = service.Lent() ? Error(errors::kNoModeSwitch) : service.RequireServer(server);
     if (status.Failed()) return status;
     Session* set = service.GetSession();
     Session& session = set ? *set : service.OwnSession();
@@ -170,6 +170,7 @@ sword EnterLinks(dvoid* handle, OCIError* errhp, void (*act)(Link&),
         if (!object) return InvalidHandle();
         if (object->Type() == OCI_HTYPE_SVCCTX) {
             auto& service = static_cast<ServiceContext&>(*object);
+            if (service.Lent()) return Error(errors::kNoModeSwitch);
             Server* server = nullptr;
             const Session* session = service.GetSession();
             const std::shared_ptr<Link> link = session ? session->ShareLink() : nullptr;
@@ -232,10 +233,11 @@ sword OCISessionBegin(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4 creden
 }
 
 sword OCISessionEnd(OCISvcCtx* svc, OCIError* err, OCISession* ses, ub4) {
-    return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext&) {
+    return EnterUnlocked<ServiceContext>(svc, err, [&](const ServiceContext& service) {
         auto* session = Live<Session>(ses);
         const LongCall may_take_long;
         if (!session) return InvalidHandle();
+        if (service.Lent() && service.GetSession() == session) return Error(errors::kNoModeSwitch);
         return ServiceContext::IsOfObtained(*session) ? Error(errors::kMustRelease) : session->End();
     });
 }

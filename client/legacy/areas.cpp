@@ -1,7 +1,14 @@
 // The register of the areas that are known, and the handles behind them.
 #include "legacy/areas.h"
 
+#include <algorithm>
+#include <new>
 #include <unordered_map>
+
+#include "handles/gate.h"
+#include "legacy/unfinished.h"
+#include "sessions/service_context.h"
+#include "statements/statement.h"
 
 namespace legacy {
 namespace {
@@ -25,10 +32,38 @@ std::shared_ptr<Value> Find(const std::unordered_map<const void*, std::shared_pt
     return found == areas.end() ? nullptr : found->second;
 }
 
+// Logins whose lenders are gone go when somebody looks.
+void ForgetOver() noexcept {
+    const auto next = [] {
+        const std::lock_guard lock(Known().mutex);
+        const auto found = std::find_if(Known().logins.begin(), Known().logins.end(),
+                                        [](const auto& known) { return known.second->Over(); });
+        return found == Known().logins.end() ? nullptr : found->first;
+    };
+    while (const void* const area = next()) {
+        try {
+            std::vector<std::shared_ptr<Cursor>> cursors;
+            if (const std::shared_ptr<Login> login = ForgetLogin(area, cursors)) EndLogin(*login, cursors);
+        } catch (const std::bad_alloc&) {    // the next one who looks
+            return;
+        }
+    }
+}
+
 }  // namespace
 
+Login::Login() = default;
+
 Login::~Login() {
+    StopUnfinished();
     if (environment) (void)OCIHandleFree(environment, OCI_HTYPE_ENV);
+}
+
+// A context that was freed may not be destroyed yet; as long as the loan lasts no other one has its place.
+bool Login::Over() const noexcept {
+    if (!lender || loan.expired()) return lender;
+    const CallInFlight call;
+    return !Live<ServiceContext>(lender);
 }
 
 bool Login::Open() {
@@ -55,13 +90,34 @@ bool Cursor::Open() {
     statement = static_cast<OCIStmt*>(handle);
     if (OCIDescriptorAlloc(login->environment, &handle, OCI_DTYPE_ROWID, 0, nullptr) != OCI_SUCCESS) return false;
     row_id = static_cast<OCIRowid*>(handle);
+    const CallInFlight call;
+    if (auto* const opened = Live<Statement>(statement)) opened->kept_row = std::make_unique<KeptRow>();
     return true;
 }
 
-std::shared_ptr<Login> FindLogin(const void* area) { return Find(Known().logins, area); }
-std::shared_ptr<Cursor> FindCursor(const void* area) { return Find(Known().cursors, area); }
+std::shared_ptr<Login> FindLogin(const void* area) {
+    std::shared_ptr<Login> login = Find(Known().logins, area);
+    if (!login || !login->Over()) return login;
+    ForgetOver();
+    return nullptr;
+}
+
+std::shared_ptr<Cursor> FindCursor(const void* area) {
+    std::shared_ptr<Cursor> cursor = Find(Known().cursors, area);
+    if (!cursor || !cursor->login->Over()) return cursor;
+    ForgetOver();
+    return nullptr;
+}
+
+void EndLogin(Login& login, const std::vector<std::shared_ptr<Cursor>>& cursors) noexcept {
+    const std::lock_guard turn(login.turn);
+    login.StopUnfinished();
+    for (const auto& cursor : cursors) cursor->ended = true;
+    login.ended = true;
+}
 
 void Enter(const void* area, std::shared_ptr<Login> login) {
+    ForgetOver();
     const std::lock_guard lock(Known().mutex);
     Known().logins[area] = std::move(login);
 }
@@ -69,6 +125,13 @@ void Enter(const void* area, std::shared_ptr<Login> login) {
 void Enter(const void* area, std::shared_ptr<Cursor> cursor) {
     const std::lock_guard lock(Known().mutex);
     Known().cursors[area] = std::move(cursor);
+}
+
+std::size_t CountCursors(const Login& login) {
+    const std::lock_guard lock(Known().mutex);
+    return static_cast<std::size_t>(std::count_if(Known().cursors.begin(), Known().cursors.end(), [&login](const auto& known) {
+        return known.second->login.get() == &login;
+    }));
 }
 
 std::shared_ptr<Cursor> ForgetCursor(const void* area) {

@@ -3,7 +3,8 @@
 // and the service context with its session; a cursor owns a statement of that environment.
 //
 // Threads: the register has a lock of its own. Calls on one login, its cursors included, take turns by the login's lock;
-// who waited for it looks whether the area is still what it was (`ended`).
+// who waited for it looks whether the area is still what it was (`ended`). A call that was left unfinished goes on in a
+// thread of its own, without that lock: as long as it does, all that touches handles or cursors of the login is refused.
 #pragma once
 
 #include <cstdint>
@@ -16,18 +17,28 @@
 #include "handles/errors.h"
 #include "oci.h"
 #include "oci_legacy.h"
+#include "sessions/link_mark.h"
 
 namespace legacy {
 
+class Cursor;
+class UnfinishedCall;
+
 class Login {
 public:
-    Login() = default;
+    Login();
     ~Login();
     Login(const Login&) = delete;
     Login& operator=(const Login&) = delete;
 
     // Environment, error handle; false without memory.
     [[nodiscard]] bool Open();
+    // The context that lent the session is gone, or was taken back, and the login with it.
+    [[nodiscard]] bool Over() const noexcept;
+    // Whether a call of another cursor's has not ended; null: of any.
+    [[nodiscard]] bool IsBusy(const Cursor* but = nullptr) const { return unfinished || (undoing && undoing != but); }
+    // What runs in a thread of its own is stopped and waited for.
+    void StopUnfinished() noexcept;
 
     std::recursive_mutex turn;
     bool ended = false;    // under the lock, as what follows
@@ -35,6 +46,10 @@ public:
     OCIError* error = nullptr;
     OCISvcCtx* service = nullptr;
     bool borrowed = false;    // the service context is a connection's of the XA switch
+    OCISvcCtx* lender = nullptr;        // whose session `service` uses
+    std::weak_ptr<const void> loan;
+    std::unique_ptr<UnfinishedCall> unfinished;
+    const Cursor* undoing = nullptr;    // whose execute waits for pieces, and undoes all it did if it fails
     bool commits = false;    // each execute that succeeds
     int last_error = 0;      // with the engine's words, for oerhms
     std::string last_message;
@@ -77,6 +92,10 @@ public:
     ub4 rows_before = 0;            // the same, without the fetch that runs
     enum class Waits : std::uint8_t { no, execute, fetch };
     Waits waits = Waits::no;
+    std::unique_ptr<LinkMark> mark;    // what the execute that waits is undone to
+    // Set by oopt.
+    bool undoes_all = false;           // an execute that fails
+    bool waits_for_locks = true;
     std::map<const dvoid*, PieceArea> pieces;    // by bind or define handle
 };
 
@@ -85,9 +104,12 @@ std::shared_ptr<Cursor> FindCursor(const void* area);
 // Throw std::bad_alloc and change nothing then.
 void Enter(const void* area, std::shared_ptr<Login> login);
 void Enter(const void* area, std::shared_ptr<Cursor> cursor);
+std::size_t CountCursors(const Login& login);
 // What was known is no longer; null when nothing was.
 std::shared_ptr<Cursor> ForgetCursor(const void* area);
 // The login, and the cursors on it as `cursors`.
 std::shared_ptr<Login> ForgetLogin(const void* area, std::vector<std::shared_ptr<Cursor>>& cursors);
+// Once it is forgotten: whoever waits for its turn finds it ended.
+void EndLogin(Login& login, const std::vector<std::shared_ptr<Cursor>>& cursors) noexcept;
 
 }  // namespace legacy

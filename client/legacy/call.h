@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <new>
+#include <utility>
 
 #include "legacy/areas.h"
 
@@ -44,8 +45,11 @@ sword OnLogin(Lda_Def* area, Body&& body) noexcept {
     if (!login) return errors::kInvalidCursor;
     const std::lock_guard turn(login->turn);
     if (login->ended) return errors::kInvalidCursor;
-    return SetResult(*area, Function::none, Guarded([&] { return body(*login); }));
+    return SetResult(*area, Function::none, login->IsBusy() ? errors::kOperationActive : Guarded([&] { return body(*login); }));
 }
+
+// Whether a call on the cursor has to wait for another call's end.
+bool IsRefused(const Cursor& cursor, Function function) noexcept;
 
 // body(Cursor&)
 template <class Body>
@@ -54,9 +58,9 @@ sword OnCursor(Cda_Def* area, Function function, Body&& body) noexcept {
     if (!cursor) return errors::kInvalidCursor;
     const std::lock_guard turn(cursor->login->turn);
     if (cursor->ended) return errors::kInvalidCursor;
-    cursor->truncated = false;
+    if (IsRefused(*cursor, function)) return SetResult(*area, function, errors::kOperationActive);
     const sword result = SetResult(*area, function, Guarded([&] { return body(*cursor); }));
-    if (cursor->truncated) area->wrn = 3;
+    if (result != errors::kStillExecuting && std::exchange(cursor->truncated, false)) area->wrn = 3;
     return result;
 }
 

@@ -7,6 +7,8 @@
 #include <utility>
 
 #include "handles/gate.h"
+#include "legacy/options.h"
+#include "legacy/unfinished.h"
 #include "sql/statement_text.h"
 #include "statements/statement.h"
 #include "values/rowid_descriptor.h"
@@ -21,12 +23,6 @@ Value Attribute(const Cursor& cursor, ub4 attribute) {
     return value;
 }
 
-int RunStatement(Cursor& cursor, ub4 iterations, ub4 first, ub4 mode) {
-    return Outcome(OCIStmtExecute(cursor.login->service, cursor.statement, cursor.error, iterations, first, nullptr,
-                                  nullptr, mode),
-                   cursor);
-}
-
 void NoteOffset(const Cursor& cursor, Cda_Def& area) { area.peo = Attribute<ub2>(cursor, OCI_ATTR_PARSE_ERROR_OFFSET); }
 
 // Whether the next call has to give or take a piece: then the direction is told from what is wanted.
@@ -39,8 +35,15 @@ int AskForPiece(Cursor& cursor, int result, Cursor::Waits by) {
     return direction == OCI_PARAM_OUT ? errors::kWantsBuffer : errors::kWantsPiece;
 }
 
+// The row that was fetched last, for oflng; null without the statement.
+void ForgetRow(Cursor& cursor) {
+    const CallInFlight call;
+    if (auto* const statement = Live<Statement>(cursor.statement)) statement->kept_row->Forget();
+}
+
 // The result is gone, and with it an operation that waits for a piece.
 void EndResult(Cursor& cursor) {
+    GiveUpExecute(cursor);
     if (cursor.has_result || cursor.waits != Cursor::Waits::no) {
         const CallInFlight call;
         if (auto* const statement = Live<Statement>(cursor.statement)) {
@@ -65,6 +68,7 @@ int ParseNow(Cursor& cursor, bool is_definition) {
 
 int ParseText(Cursor& cursor, Cda_Def& area, std::string_view sql, bool deferred) {
     EndResult(cursor);
+    ForgetRow(cursor);
     cursor.parsed = cursor.compiled = cursor.described = cursor.definition_ran = false;
     cursor.highest_define = 0;
     cursor.rows = cursor.rows_before = 0;
@@ -118,6 +122,7 @@ int Run(Cursor& cursor, Cda_Def& area, ub4 iterations, ub4 first) {
     cursor.rows = cursor.rows_before = 0;
     area.rpc = 0;
     area.rid = {};
+    ForgetRow(cursor);
     if (std::exchange(cursor.definition_ran, false)) return 0;
     cursor.has_result = false;
     const bool goes_on = cursor.waits == Cursor::Waits::execute;
@@ -127,7 +132,8 @@ int Run(Cursor& cursor, Cda_Def& area, ub4 iterations, ub4 first) {
     if (cursor.waits != Cursor::Waits::no) return result;
     if (result == 0) cursor.compiled = true;
     else if (!goes_on) NoteOffset(cursor, area);
-    if (!cursor.is_query) area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROW_COUNT);
+    const bool undone = result != 0 && cursor.undoes_all;
+    if (!cursor.is_query && !undone) area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROW_COUNT);
     if (result == 0 && area.rpc == 1 && !cursor.is_query) NoteRow(cursor, area);
     return result == 0 && cursor.is_query ? Opened(cursor) : result;
 }
@@ -137,7 +143,10 @@ int FetchRows(Cursor& cursor, Cda_Def& area, sword rows) {
     if (rows < 1) return errors::kNoIterations;
     if (cursor.waits == Cursor::Waits::execute) return errors::kOperationActive;
     if (!cursor.has_result) return errors::kFetchOutOfSequence;
-    if (cursor.waits == Cursor::Waits::no) cursor.rows_before = cursor.rows;
+    if (cursor.waits == Cursor::Waits::no) {
+        cursor.rows_before = cursor.rows;
+        ForgetRow(cursor);
+    }
     int result = Outcome(OCIStmtFetch2(cursor.statement, cursor.error, static_cast<ub4>(rows), OCI_FETCH_NEXT, 0,
                                        OCI_DEFAULT),
                          cursor);
@@ -153,6 +162,7 @@ int FetchExactly(Cursor& cursor, Cda_Def& area, ub4 rows) {
     cursor.rows = cursor.rows_before = 0;
     area.rpc = 0;
     if (cursor.waits == Cursor::Waits::no) {
+        ForgetRow(cursor);
         if (const int failed = Compile(cursor)) {
             NoteOffset(cursor, area);
             return failed;
@@ -243,12 +253,13 @@ int Compile(Cursor& cursor) {
 sword OpenCursor(Cda_Def* area, Lda_Def* login_area) {
     const std::shared_ptr<Login> login = FindLogin(login_area);
     if (!area || FindLogin(area)) return errors::kInvalidCursor;
-    if (FindCursor(area)) (void)CloseCursor(area);
+    if (FindCursor(area) && CloseCursor(area) == errors::kOperationActive) return errors::kOperationActive;
     std::memset(area, 0, sizeof *area);
     return SetResult(*area, Function::oopen, Guarded([&]() -> int {
         if (!login) return errors::kInvalidCursor;
         const std::lock_guard turn(login->turn);
         if (login->ended) return errors::kInvalidCursor;
+        if (login->IsBusy()) return errors::kOperationActive;
         const auto cursor = std::make_shared<Cursor>(login);
         if (!cursor->Open()) return errors::kOutOfMemory;
         Enter(area, cursor);
@@ -263,6 +274,10 @@ sword CloseCursor(Cda_Def* area) {
     });
 }
 
+void EndResults(const std::vector<std::shared_ptr<Cursor>>& cursors) {
+    for (const auto& cursor : cursors) End(cursor);
+}
+
 sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 language) {
     return OnCursor(area, Function::oparse, [&](Cursor& cursor) -> int {
         if (!sql) return errors::kParameterMissing;
@@ -274,37 +289,39 @@ sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 langu
 }
 
 sword Execute(Cda_Def* area) {
-    return OnStatement(area, Function::oexec, [&](Cursor& cursor) { return Run(cursor, *area, 1, 0); });
+    return OnRunningStatement(area, Function::oexec, [](Cursor& cursor, Cda_Def& fields) { return Run(cursor, fields, 1, 0); });
 }
 
 sword ExecuteRows(Cda_Def* area, sword iterations, sword first) {
-    return OnStatement(area, Function::oexec, [&](Cursor& cursor) -> int {
+    return OnRunningStatement(area, Function::oexec, [iterations, first](Cursor& cursor, Cda_Def& fields) -> int {
         const bool some = first >= 0 && iterations > first;
         if (!some && !cursor.is_query) {
-            area->rpc = 0;
+            fields.rpc = 0;
             return errors::kNoIterations;
         }
-        return Run(cursor, *area, some ? static_cast<ub4>(iterations) : 1, some ? static_cast<ub4>(first) : 0);
+        return Run(cursor, fields, some ? static_cast<ub4>(iterations) : 1, some ? static_cast<ub4>(first) : 0);
     });
 }
 
 sword ExecuteAndFetch(Cda_Def* area, ub4 rows, bool cancel, bool exact) {
-    return OnStatement(area, Function::oexfet, [&](Cursor& cursor) -> int {
-        area->rpc = 0;
+    return OnRunningStatement(area, Function::oexfet, [rows, cancel, exact](Cursor& cursor, Cda_Def& fields) -> int {
+        fields.rpc = 0;
         if (!cursor.is_query) return errors::kFetchOutOfSequence;
         if (rows == 0) return errors::kNoIterations;
         if (rows > static_cast<ub4>(std::numeric_limits<sword>::max())) return errors::kParameterOutOfRange;
-        return exact ? FetchExactly(cursor, *area, rows) : RunAndFetch(cursor, *area, static_cast<sword>(rows), cancel);
+        return exact ? FetchExactly(cursor, fields, rows) : RunAndFetch(cursor, fields, static_cast<sword>(rows), cancel);
     });
 }
 
 sword Fetch(Cda_Def* area, sword rows) {
-    return OnStatement(area, Function::ofetch, [&](Cursor& cursor) { return FetchRows(cursor, *area, rows); });
+    return OnRunningStatement(area, Function::ofetch,
+                              [rows](Cursor& cursor, Cda_Def& fields) { return FetchRows(cursor, fields, rows); });
 }
 
 sword Cancel(Cda_Def* area) {
     return OnCursor(area, Function::ocan, [](Cursor& cursor) {
         EndResult(cursor);
+        ForgetRow(cursor);
         return 0;
     });
 }

@@ -7,6 +7,8 @@ namespace legacy {
 
 sword OpenCursor(Cda_Def* area, Lda_Def* login);
 sword CloseCursor(Cda_Def* area);
+// Of cursors that the register no longer knows; under their login's turn.
+void EndResults(const std::vector<std::shared_ptr<Cursor>>& cursors);
 sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 language);
 sword Execute(Cda_Def* area);
 sword ExecuteRows(Cda_Def* area, sword iterations, sword first);
@@ -58,6 +60,15 @@ sword BindName(Cda_Def* area, Function function, Name name, Place place, Table t
 sword BindNumber(Cda_Def* area, sword number, Place place);
 sword GetPiece(Cda_Def* area, ub1* piece, dvoid** context, ub4* iteration, ub4* index);
 sword SetPiece(Cda_Def* area, ub1 piece, dvoid* buffer, ub4* length);
+// Part of a text or of bytes in the row fetched last, as they are (parts.cpp).
+struct Part {
+    dvoid* buffer;
+    sb4 room;
+    sword type;
+    ub4* length;
+    sb4 offset;
+};
+sword ReadPart(Cda_Def* area, sword position, const Part& part);
 // Gets the columns of a query that is compiled.
 int Compile(Cursor& cursor);
 

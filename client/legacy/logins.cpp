@@ -158,6 +158,7 @@ sword DescribeProcedure(Lda_Def* area, const text* name, ub4* count) {
 // A session that is gone has nothing to commit: the area is forgotten all the same.
 sword LogOff(Lda_Def* area) {
     return OnLogin(area, [area](Login& login) -> int {
+        if (login.lender) return errors::kInvalidCall;
         const int result =
             login.borrowed ? 0 : Outcome(OCILogoff(login.service, login.error), login.error, login);
         if (result != 0 && !IsGone(result)) return result;
@@ -231,7 +232,7 @@ sword Message(const Lda_Def* area, int code, text* buffer, sword size) {
         std::string message;
         if (const std::shared_ptr<Login> login = FindLogin(area)) {
             const std::lock_guard turn(login->turn);
-            if (login->last_error == code) message = login->last_message;
+            if (!login->unfinished && login->last_error == code) message = login->last_message;
         }
         if (message.empty()) message = ErrorMessage(code, Status::kClient, {});
         const std::size_t room = std::min(kMost, static_cast<std::size_t>(size));

@@ -119,6 +119,15 @@ Status Server::Attach(std::shared_ptr<ConnectionSource> source) {
     return Attach(source->GetDatabase(), source->DatabaseName(), source);
 }
 
+Status Server::AttachLike(const Server& other) {
+    const SerialLock turn(serial_);
+    if (Attached()) return Error(errors::kAlreadyAttached);
+    std::shared_ptr<engine::Database> database = other.AttachedDatabase();
+    if (!database) return Error(errors::kNotConnected);
+    if (NonBlocking() != other.NonBlocking()) ToggleNonBlocking();
+    return Attach(std::move(database), other.name_, nullptr);
+}
+
 Status Server::Attach(std::shared_ptr<engine::Database> database, std::string name,
                       std::shared_ptr<ConnectionSource> source) {
     name_ = std::move(name);

@@ -44,6 +44,7 @@ public:
 
     Status Attach(std::string_view database);
     Status Attach(std::shared_ptr<ConnectionSource> source);
+    Status AttachLike(const Server& other);    // in the same mode, too; not to a pool
     Status Detach();    // sessions that are still begun are dropped: what they did not commit is rolled back
 
     // What is attached; null when nothing is.

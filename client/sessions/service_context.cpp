@@ -82,6 +82,8 @@ Status ServiceContext::RequireServer(Server*& server) {
 }
 
 Status ServiceContext::Require(std::shared_ptr<Link>& link) {
+    link = nullptr;
+    if (lent_) return Error(errors::kNoModeSwitch);
     const Session* session = GetSession();
     link = session ? session->ShareLink() : nullptr;
     if (link) return {};
@@ -120,10 +122,7 @@ Session& ServiceContext::OwnSession() {
 
 Status ServiceContext::LogOn(const Target& target, const engine::Credentials& credentials, EndedBy ended_by) {
     const SerialLock changing(changing_);
-    if (logged_on_) {
-        Status ended = LogOff();
-        if (ended.Failed() && logged_on_) return ended;
-    }
+    if (Status status = EndFormer(); status.Failed()) return status;
     Server& server = OwnServer();
     Session& session = OwnSession();
     Status status = target.source ? server.Attach(target.source) : server.Attach(target.database);
@@ -139,6 +138,13 @@ Status ServiceContext::LogOn(const Target& target, const engine::Credentials& cr
     obtained_ = ended_by == EndedBy::release;
     logged_on_ = true;
     return status;
+}
+
+Status ServiceContext::EndFormer() {
+    if (lent_) return Error(errors::kNoModeSwitch);
+    if (!logged_on_) return {};
+    Status ended = LogOff();
+    return logged_on_ ? ended : Status();
 }
 
 Status ServiceContext::LogOff() {
@@ -157,10 +163,46 @@ Status ServiceContext::LogOff() {
 Status ServiceContext::Release(GivingBack how) {
     const SerialLock changing(changing_);
     if (!obtained_) return Error(errors::kCannotRelease);
+    if (lent_) return Error(errors::kNoModeSwitch);
     Status status = own_session_->End(&how);
     if (status.Failed() && own_session_->Begun()) return status;
     const Status detached = Forget();
     return status.Failed() ? status : detached;
+}
+
+Status ServiceContext::Lend(std::weak_ptr<const void>& loan) {
+    const SessionTurn turn(*this);
+    if (!turn.link) return turn.status;
+    if (lent_) return Error(errors::kNoModeSwitch);    // while the lock was waited for
+    auto made = std::make_shared<int>();
+    loan = made;
+    loan_ = std::move(made);
+    lent_ = true;
+    return {};
+}
+
+void ServiceContext::TakeBack() noexcept {
+    const SerialLock lock(Serial());
+    lent_ = false;
+    loan_.reset();
+}
+
+Status ServiceContext::TakeOver(ServiceContext& from) {
+    const SerialLock changing(changing_);
+    if (Status status = EndFormer(); status.Failed()) return status;
+    Server& server = OwnServer();
+    Session& session = OwnSession();
+    Status status = server.AttachLike(*from.own_server_);
+    if (status.Ok()) status = session.TakeOver(*from.own_session_, server);
+    if (status.Failed()) {
+        (void)server.Detach();
+        return status;
+    }
+    server_ = &server;
+    session_ = &session;
+    logged_on_ = true;
+    (void)from.Forget();
+    return {};
 }
 
 Status ServiceContext::Forget() {

@@ -29,7 +29,8 @@ public:
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
     [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
 
-    // The link that statements run on: error 3114 without an attached server, 1012 before a session is begun.
+    // The link that statements run on: error 3114 without an attached server, 1012 before a session is begun, 24406
+    // while the context is lent.
     Status Require(std::shared_ptr<Link>& link);
     // The attached server, whether or not a session is begun: else 3114.
     Status RequireServer(Server*& server);
@@ -55,6 +56,14 @@ public:
     // The same; 24421 when nothing is to be released. A session that broke, or is gone, is ended all the same.
     Status Release(GivingBack how);
     [[nodiscard]] bool Obtained() const { return obtained_; }    // to be released
+    // Gives the session to calls of another kind until it is taken back: nobody else uses it through this context. The
+    // loan lasts as long as `loan` is not expired, which the end of the context ends, too.
+    Status Lend(std::weak_ptr<const void>& loan);
+    void TakeBack() noexcept;
+    [[nodiscard]] bool Lent() const { return lent_; }
+    // Logs on with the session of a context that is logged on by itself, which is logged off then; its transaction goes
+    // on. An own session is ended first, as by LogOn.
+    Status TakeOver(ServiceContext& from);
     // Whether a server or a session is the own one of such a context.
     [[nodiscard]] static bool IsOfObtained(const Object& own);
     // The session that the context is to be used with when the application set none: the context's own.
@@ -67,12 +76,15 @@ public:
 private:
     Server& OwnServer();
     Status Forget();    // the session has ended
+    Status EndFormer();    // before a logon
 
     std::atomic<const void*> server_{nullptr};     // read from any thread
     std::atomic<const void*> session_{nullptr};
     std::atomic<const void*> transaction_{nullptr};
     std::atomic<bool> logged_on_{false};            // by a logon call: server and session are read-only
     std::atomic<bool> obtained_{false};
+    std::atomic<bool> lent_{false};
+    std::shared_ptr<const void> loan_;    // under the serial lock of the session
     const std::shared_ptr<std::recursive_mutex> changing_;    // null in an environment without threads; of the next
     Server* own_server_ = nullptr;      // children; InUse keeps the application from freeing them
     Session* own_session_ = nullptr;

@@ -93,6 +93,19 @@ Status Session::End(GivingBack* released) {
     return status;
 }
 
+// A server that took the place of the one before, and an end in another thread meanwhile, leave nothing to take.
+Status Session::TakeOver(Session& from, Server& server) {
+    const Turn turn(from);
+    if (!turn.link || ShareLink()) return Error(errors::kNotLoggedOn);
+    user = turn.link->user;
+    if (!server.Join(*this, turn.link, turn.link->Database())) return Error(errors::kNotConnected);
+    server_ = &server;
+    link_.Set(turn.link);
+    std::exchange(from.server_, nullptr)->Leave(from);
+    from.link_.Set(nullptr);
+    return {};
+}
+
 Status Session::ChangePassword(const std::string& user_name, const std::string& old_password,
                                const std::string& new_password) {
     const Turn turn(*this);

@@ -34,6 +34,8 @@ public:
     Status Begin(Server& server, const engine::Credentials& credentials);
     // Commits; an error leaves the session as it was, but for a broken one that is to be `released`.
     Status End(GivingBack* released = nullptr);
+    // Begins with what another session has begun, which has ended then: link, transaction and all.
+    Status TakeOver(Session& from, Server& server);
     // On the session's own connection: error 1012 when it is not begun.
     Status ChangePassword(const std::string& user_name, const std::string& old_password,
                           const std::string& new_password);

@@ -71,10 +71,16 @@ Status Statement::FindFirst(ub2 orientation, sb4 offset, std::uint64_t& position
     return {};
 }
 
+// A row that is refused was not fetched.
 Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> values) {
+    KeptRow* const kept = statement_.kept_row.get();
+    if (kept) kept->Keep(values, statement_.run_.cursor.Columns());
     ++rows;
     const int error = statement_.defines_.StoreRow(index_, values);
-    if (error != 0 && error != errors::kTruncationWarning) return Error(error);
+    if (error != 0 && error != errors::kTruncationWarning) {
+        if (kept) kept->Forget();
+        return Error(error);
+    }
     if (error != 0) warning_ = Warning(error);
     if (in_pieces_) {
         const bool has_lobs =

@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "handles/errors.h"
-#include "sessions/link.h"
+#include "sessions/link_mark.h"
 #include "statements/statement.h"
 
 namespace {
@@ -21,44 +21,6 @@ public:
 private:
     PieceStream& pieces_;
     const int before_ = std::uncaught_exceptions();
-};
-
-// What one iteration can be undone to. The session may go while callbacks run, and the transaction end: the mark goes
-// with them, and what follows is none of its business.
-class IterationMark {
-public:
-    explicit IterationMark(std::shared_ptr<Link> link) : link_(std::move(link)) {}
-    ~IterationMark() {
-        bool is_undone = false;
-        if (is_set_) (void)Undo(is_undone);
-    }
-    IterationMark(const IterationMark&) = delete;
-    IterationMark& operator=(const IterationMark&) = delete;
-
-    Status Set() {
-        began_ = !link_->Engine().InTransaction();
-        Status status = link_->Engine().SetMark();
-        is_set_ = status.Ok();
-        return status;
-    }
-    Status Keep() {
-        Status status = TakeStanding() ? link_->Engine().DropMark() : Status();
-        return status.Number() == errors::kNoSuchSavepoint ? Status() : status;
-    }
-    Status Undo(bool& is_undone) {
-        if (!TakeStanding()) return {};
-        Status status = link_->Engine().UndoToMark();
-        is_undone = status.Number() != errors::kNoSuchSavepoint;
-        if (!status.Ok()) return status;
-        return began_ ? link_->Engine().Rollback() : link_->Engine().DropMark();
-    }
-
-private:
-    bool TakeStanding() { return std::exchange(is_set_, false) && !link_->Closed() && link_->Engine().InTransaction(); }
-
-    const std::shared_ptr<Link> link_;
-    bool began_ = false;
-    bool is_set_ = false;
 };
 
 }  // namespace
@@ -122,7 +84,7 @@ Status Statement::RunCollected(bool& stopped) {
 Status Statement::RunAndDeliver(bool& stopped) {
     const std::uint64_t affected = outcome_.affected, count = run_.row_count;
     const std::uint32_t executed = outcome_.executed;
-    IterationMark mark(UsedLink());
+    LinkMark mark(UsedLink());
     Status status = mark.Set();
     stopped = !status.Ok();
     if (stopped) return status;

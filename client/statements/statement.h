@@ -29,6 +29,7 @@
 #include "statements/define.h"
 #include "statements/defines.h"
 #include "statements/execution.h"
+#include "statements/kept_row.h"
 #include "statements/piece_stream.h"
 #include "statements/share.h"
 #include "statements/targets.h"
@@ -88,6 +89,8 @@ public:
     void Rest() noexcept;
     void Join(const std::shared_ptr<Link>& link) { Use(link); }
     [[nodiscard]] StatementCache* Cache() const;    // of the session; null when it is off
+
+    std::unique_ptr<KeptRow> kept_row;    // null: nobody wants it
 
     // Attributes that are only kept.
     std::uint32_t prefetch_rows = 1;

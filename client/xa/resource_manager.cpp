@@ -74,7 +74,9 @@ Answer ResourceManager::LogOn() {
 
 Status ResourceManager::LogOff() {
     ServiceContext* const service = GetService();
-    return service ? service->LogOff() : Status();
+    if (!service) return {};
+    service->TakeBack();
+    return service->LogOff();
 }
 
 ManagerPointer FindManager(int rmid) {

@@ -18,6 +18,7 @@ constexpr const char* kSetGuard = "savepoint kelp_guard";
 constexpr const char* kUndoGuard = "rollback to savepoint kelp_guard";
 constexpr const char* kDropGuard = "release savepoint kelp_guard";
 constexpr std::size_t kForgottenAtOnce = 20;
+constexpr const char* kNoLockWait = "1ms";    // the least; 0 is for ever
 
 constexpr const char* kBegins[] = {"begin", "begin isolation level repeatable read, read only",
                                    "begin isolation level serializable"};
@@ -63,9 +64,33 @@ Status PgConnection::Enter(Effect effect) {
         tables_.clear();
         if (Status status = Commit(); status.Failed()) return status;
     }
+    if (Status status = TellLockWait(); !status.Ok()) return status;
     if (Status status = lobs_->Settle(); status.Failed()) return status;
     lobs_->StatementRuns();
     return {};
+}
+
+// What was set in the transaction may have been taken back.
+void PgConnection::ForgetLockWait() noexcept {
+    if (!lock_timeout_.empty()) local_waits_.reset();
+}
+
+// Before a statement. Most sessions never wish for anything else than what they have.
+Status PgConnection::TellLockWait() {
+    if (local_waits_ == waits_) return {};
+    Result result;
+    if (lock_timeout_.empty()) {
+        Status status = Ask("select pg_catalog.current_setting('lock_timeout')", {}, result);
+        if (!status.Ok()) return status;
+        lock_timeout_ = PQgetvalue(result.get(), 0, 0);
+    }
+    const bool within = in_transaction_;
+    Status status = Ask("select pg_catalog.set_config('lock_timeout', $1, $2::bool)",
+                        {waits_ ? lock_timeout_ : kNoLockWait, within ? "true" : "false"}, result);
+    if (!status.Ok()) return status;
+    if (!within) session_waits_ = waits_;
+    local_waits_ = waits_;
+    return status;
 }
 
 LobStore* PgConnection::Lobs() { return lobs_.get(); }
@@ -79,7 +104,9 @@ void PgConnection::Note() noexcept {
         SomethingUndone();
         path_may_go_ = false;
     }
-    if (!in_transaction_) savepoints_.clear();
+    if (in_transaction_) return;
+    savepoints_.clear();
+    local_waits_ = session_waits_;
 }
 
 PgConnection::Guard PgConnection::SendGuard(bool needs) noexcept {
@@ -139,6 +166,7 @@ Status PgConnection::Compile(const StatementSource& source, std::unique_ptr<Quer
                              std::uint32_t& error_offset) {
     try {
         if (Status status = Enter(); !status.Ok()) return status;
+        if (Status status = TellLockWait(); !status.Ok()) return status;
         auto made = std::make_unique<PgQuery>(*this, source);
         if (Status status = made->Prepare(error_offset); !status.Ok()) return status;
         query = std::move(made);
@@ -316,6 +344,7 @@ Status PgConnection::UndoToMark() {
     Status status = wire_->Run(MarkText("rollback to savepoint", savepoints_[mark].mark).text);
     Note();
     if (!status.Ok()) return Lose(status);
+    ForgetLockWait();
     savepoints_.erase(savepoints_.begin() + static_cast<std::ptrdiff_t>(mark) + 1, savepoints_.end());
     return status;
 }
@@ -390,6 +419,7 @@ void PgConnection::NoteSavepoint(const SavepointCommand& command) {
     }
     const auto found = std::find_if(savepoints_.rbegin(), savepoints_.rend(),
                                     [&](const Savepoint& savepoint) { return savepoint.name == command.name; });
+    ForgetLockWait();
     if (found == savepoints_.rend()) return;
     const auto kept = found.base() - (command.verb == SavepointCommand::Verb::drop ? 1 : 0);
     savepoints_.erase(kept, savepoints_.end());

@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -61,6 +62,7 @@ public:
     Status UseSchema(std::string& schema) override;
     void PreferSchemaOf(const Connection* other) noexcept override;
     LobStore* Lobs() override;
+    void WaitForLocks(bool waits) noexcept override { waits_ = waits; }
     Status Ping() override;
     [[nodiscard]] bool Broken() const override { return wire_->Broken(); }
     void Interrupt() noexcept override { wire_->Wake(); }
@@ -124,6 +126,8 @@ private:
     void SomethingUndone() noexcept;
     [[nodiscard]] std::size_t LastMark() const noexcept;    // its place; the count of savepoints: there is none
     Status Lose(const Status& failure) noexcept;
+    Status TellLockWait();
+    void ForgetLockWait() noexcept;
     Status FinishPrepared(const char* verb, const Xid& xid);
 
     std::shared_ptr<Home> home_;
@@ -147,6 +151,12 @@ private:
     bool path_stands_ = true;           // the server has what is wanted
     bool path_may_go_ = false;          // with the transaction, or a part of it
     PgQuery* streaming_ = nullptr;
+    // Whether statements wait for locks: as it is wished, as the session has it, and as the transaction has it, where
+    // that is known. The session's cannot be changed within a transaction, which takes it back when it is rolled back.
+    bool waits_ = true;
+    bool session_waits_ = true;
+    std::optional<bool> local_waits_ = true;
+    std::string lock_timeout_;    // of one that waits; asked for once
 };
 
 }  // namespace engine::postgres

@@ -117,9 +117,10 @@ const Dialect& PgDatabase::GetDialect() const {
 
 // Whether transactions can be prepared is a setting of the server's.
 const Capabilities& PgDatabase::GetCapabilities() const {
-    static constexpr Capabilities kOnePhase{.lobs = true, .sequences = true, .typed_parameters = true};
-    static constexpr Capabilities kTwoPhase{
-        .two_phase = true, .prepared_survives = true, .lobs = true, .sequences = true, .typed_parameters = true};
+    static constexpr Capabilities kOnePhase{
+        .lobs = true, .sequences = true, .typed_parameters = true, .statement_waits = true};
+    static constexpr Capabilities kTwoPhase{.two_phase = true, .prepared_survives = true, .lobs = true, .sequences = true,
+                                            .typed_parameters = true, .statement_waits = true};
     return home_->TwoPhase() ? kTwoPhase : kOnePhase;
 }
 

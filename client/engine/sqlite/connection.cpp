@@ -398,7 +398,7 @@ int SqliteConnection::OnBusy(void* self, int attempts) {
     auto& connection = *static_cast<SqliteConnection*>(self);
     const auto now = std::chrono::steady_clock::now();
     if (attempts == 0) connection.busy_since_ = now;
-    if (connection.Stopping() || now - connection.busy_since_ > kLockWait) return 0;
+    if (!connection.waits_ || connection.Stopping() || now - connection.busy_since_ > kLockWait) return 0;
     std::this_thread::sleep_for(std::min(1ms * (attempts + 1), 20ms));
     return 1;
 }

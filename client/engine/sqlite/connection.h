@@ -71,6 +71,7 @@ public:
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;
     Status UseSchema(std::string& schema) override;
     engine::LobStore* Lobs() override { return &lobs_; }
+    void WaitForLocks(bool waits) noexcept override { waits_ = waits; }
     Status Ping() override;
     [[nodiscard]] bool Broken() const override { return broken_; }
     void Interrupt() noexcept override {}    // a call looks at the request by itself, again and again
@@ -160,6 +161,7 @@ private:
     std::shared_ptr<const StopRequest> stop_;
     std::array<StatementHandle, kOwns> owns_;
     bool heeds_ = true;                // the call that runs looks at stop_
+    bool waits_ = true;                // for locks
     bool trusted_ = false;
     bool read_only_ = false;           // the transaction, if there is one
     sqlite3_int64 changes_before_ = 0; // it began

@@ -1,17 +1,28 @@
-// The version-7 calls: the numbers that they answer, and what they leave in areas and elements.
+// The version-7 calls: the numbers that they answer, and what they leave in areas and elements. On a private database in
+// memory or, with KELP_TEST_ENGINE=postgres, on the server of the test run.
 #include <gtest/gtest.h>
 
 #include <array>
+#include <chrono>
+#include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <memory>
 #include <string>
 #include <string_view>
+#include <thread>
 #include <vector>
 
 #include "kelpci.h"
 #include "oci.h"
 #include "oci_legacy.h"
+#include "support/at_once.h"
+#include "support/postgres_database.h"
 
 namespace {
+
+using namespace std::chrono_literals;
+using Clock = std::chrono::steady_clock;
 
 text* T(const char* characters) { return reinterpret_cast<text*>(const_cast<char*>(characters)); }
 
@@ -19,16 +30,37 @@ class LegacyCalls : public ::testing::Test {
 protected:
     void SetUp() override {
         std::memset(&unknown, 0x5A, sizeof unknown);
+        const char* const engine = std::getenv("KELP_TEST_ENGINE");
+        if (engine && std::string_view(engine) == "postgres") {
+            server = std::make_unique<PostgresDatabase>();
+            database = server->Url();
+            user = server->Owner() + "/secret";
+        }
         ASSERT_EQ(LogOn(lda), 0);
         ASSERT_EQ(oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1), 0);
         ASSERT_EQ(Parse("create table t (n integer, c varchar2(10))", 0), 0);
     }
-    void TearDown() override { EXPECT_EQ(ologof(&lda), 0); }
+    void TearDown() override {
+        EXPECT_EQ(ologof(&lda), 0);
+        EXPECT_EQ(OCI_memGetMemCount(), 0) << "blocks left behind";
+    }
 
-    sword LogOn(Lda_Def& area) {
-        return olog(&area, host.data(), nullptr, 0, nullptr, 0, T(":memory:"), 8, 0);
+    sword LogOn(Lda_Def& area, ub4 mode = 0) {
+        return olog(&area, host.data(), T(user.c_str()), -1, nullptr, 0, T(database.c_str()), -1, mode);
     }
     sword Parse(const char* sql, sword deferred = 1) { return oparse(&cda, T(sql), -1, deferred, 2); }
+    sword Run(const char* sql) {
+        const sword parsed = Parse(sql);
+        return parsed != 0 ? parsed : oexec(&cda);
+    }
+    // The first value of a query.
+    int One(const char* sql) {
+        int value = -1;
+        EXPECT_EQ(Parse(sql), 0);
+        EXPECT_EQ(Define(1, &value, 4, SQLT_INT), 0);
+        EXPECT_EQ(oexfet(&cda, 1, 1, 0), 0) << sql;
+        return value;
+    }
     sword Bind(const char* name, void* value, sword length, sword type) {
         return obndrv(&cda, T(name), -1, static_cast<ub1*>(value), length, type, -1, nullptr, nullptr, -1, -1);
     }
@@ -50,6 +82,8 @@ protected:
         ASSERT_EQ(cda.rpc, static_cast<ub4>(rows));
     }
 
+    std::unique_ptr<PostgresDatabase> server;
+    std::string database = ":memory:", user;
     std::array<ub1, HDA_SIZE> host{};
     Lda_Def lda{};
     Cda_Def cda{};
@@ -102,9 +136,10 @@ TEST_F(LegacyCalls, LoginsSwitchTheirModesAndEndTheirCursors) {
     EXPECT_EQ(Parse("delete from t"), 0);
     EXPECT_EQ(oexec(&cda), 0);
     EXPECT_EQ(std::make_tuple(cda.rpc, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(2u, 0u, 0));
-    ASSERT_EQ(Parse("insert into t (rowid, n) values (1 * 65536 * 65536 * 65536 + 131075, 1)"), 0);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(1, 2u, 3));
+    if (!server) {
+        EXPECT_EQ(Run("insert into t (rowid, n) values (1 * 65536 * 65536 * 65536 + 131075, 1)"), 0);
+        EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(1, 2u, 3));
+    }
     ub4 count = 5;
     EXPECT_EQ(odessp(&lda, T("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
                      nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &count), 4043);
@@ -134,13 +169,14 @@ TEST_F(LegacyCalls, TextsAreParsedAtOnceOrLater) {
 }
 
 TEST_F(LegacyCalls, ColumnsAreDescribedUntilThereIsNone) {
+    const sb4 bytes = server ? 40 : 10;    // the server counts characters
     sb4 size = 0, display = 0, length = 1;
     sb2 type = 0, nulls = 0;
     std::array<sb1, 4> name{'#', '#', '#', '#'};
     ASSERT_EQ(Parse("select n, c as ce from t"), 0);
     EXPECT_EQ(odescr(&cda, 2, &size, &type, name.data(), &length, &display, nullptr, nullptr, &nulls), 0);
     EXPECT_EQ(std::make_tuple(size, type, length, name[0], name[1], display, nulls),
-              std::make_tuple(10, 1, 1, 'C', '#', 10, 1));
+              std::make_tuple(bytes, 1, 1, 'C', '#', bytes, 1));
     EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);    // at once, since it is compiled
     EXPECT_EQ(Define(1, &number, 4, SQLT_INT), 0);
     EXPECT_EQ(oexec(&cda), 0);
@@ -287,10 +323,385 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
     EXPECT_EQ(oermsg(1, nullptr), 1009);
     EXPECT_EQ(Parse("select x from t", 0), 904);
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 512), 0);
-    EXPECT_NE(std::string_view(words).find("no such column: x"), std::string_view::npos) << words;
+    const char* const told = server ? "column \"x\" does not exist" : "no such column: x";
+    EXPECT_NE(std::string_view(words).find(told), std::string_view::npos) << words;
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 5), 0);
     EXPECT_STREQ(words, "[KEL");
     EXPECT_EQ(oerhms(nullptr, 942, message.data(), 0), 1009);
+}
+
+TEST_F(LegacyCalls, PartsOfLongValues) {
+    ASSERT_EQ(Run("create table l (n integer, c long, r raw(10))"), 0);
+    ASSERT_EQ(Run("insert into l values (1, 'abcdefghij', hextoraw('00FF41'))"), 0);
+    ASSERT_EQ(Run("insert into l values (2, null, null)"), 0);
+    ASSERT_EQ(Parse("select n, c, r from l order by n"), 0);
+    ub4 length = 9;
+    std::string part(4, '#');
+    const auto read = [&](sword position, sb4 offset, sb4 room = 4, sword type = 8) {
+        part.assign(4, '#');
+        return oflng(&cda, position, reinterpret_cast<ub1*>(part.data()), room, type, &length, offset);
+    };
+    EXPECT_EQ(read(2, 0), 1002);
+    std::array<int, 2> numbers{};
+    ASSERT_EQ(Define(1, numbers.data(), 4, SQLT_INT), 0);
+    ASSERT_EQ(oexec(&cda), 0);
+    EXPECT_EQ(read(2, 0), 1002);
+    ASSERT_EQ(ofetch(&cda), 0);
+    const struct { sword position; sb4 offset; std::string_view expected; } kParts[] = {
+        {2, 0, "abcd"}, {2, 8, "ij##"}, {2, 10, "####"}, {2, 70000, "####"}, {3, 0, {"\0\xFF" "A#", 4}}, {3, 1, "\xFF" "A##"}};
+    for (const auto& [position, offset, expected] : kParts) {
+        EXPECT_EQ(read(position, offset), 0);
+        EXPECT_EQ(part, expected);
+        EXPECT_EQ(length, std::min<std::size_t>(4, expected.find('#')));
+    }
+    EXPECT_EQ(oflng(&cda, 2, nullptr, 0, 8, nullptr, 0), 0);
+    const struct { sword position; sb4 offset, room; sword type, result; } kRefused[] = {
+        {1, 0, 4, 8, 932}, {0, 0, 4, 8, 1007}, {4, 0, 4, 8, 1007}, {70000, 0, 4, 8, 1007}, {2, -1, 4, 8, 1025},
+        {2, 0, -1, 8, 1025}, {2, 0, 4, 3, 1024}, {2, 0, 4, 112, 1024}};
+    for (const auto& c : kRefused) EXPECT_EQ(read(c.position, c.offset, c.room, c.type), c.result) << c.position;
+    EXPECT_EQ(cda.fc, 58);
+    EXPECT_EQ(ofetch(&cda), 0);
+    EXPECT_EQ(read(2, 0), 1405);
+    EXPECT_EQ(ofetch(&cda), 1403);
+    EXPECT_EQ(read(2, 0), 1002);
+    EXPECT_EQ(oexec(&cda), 0);
+    EXPECT_EQ(ofen(&cda, 2), 0);    // of several the last
+    EXPECT_EQ(read(3, 0), 1405);
+    EXPECT_EQ(ocan(&cda), 0);
+    EXPECT_EQ(read(3, 0), 1002);
+}
+
+TEST_F(LegacyCalls, ExecutesThatFailUndoARowOrAll) {
+    ASSERT_EQ(Run("create unique index u on t (n)"), 0);
+    ASSERT_EQ(Run("insert into t values (9, null)"), 0);
+    for (const auto& [rollback, wait] : {std::pair{1, 0}, {3, 0}, {2, 1}, {2, 3}, {-1, 4}}) {
+        EXPECT_EQ(oopt(&cda, rollback, wait), 1025);
+    }
+    std::array<int, 4> numbers{1, 2, 1, 3};
+    const auto insert = [&](sword rollback) {
+        EXPECT_EQ(Parse("insert into t values (:n, null)"), 0);
+        EXPECT_EQ(oopt(&cda, rollback, 0), 0);
+        EXPECT_EQ(Bind("n", numbers.data(), 4, SQLT_INT), 0);
+        return oexn(&cda, 4, 0);
+    };
+    EXPECT_EQ(insert(0), 1);
+    EXPECT_EQ(cda.rpc, 0u);
+    EXPECT_EQ(One("select count(*) from t"), 1);
+    EXPECT_EQ(insert(2), 1);
+    EXPECT_EQ(cda.rpc, 2u);
+    EXPECT_EQ(One("select count(*) from t"), 3);
+    EXPECT_EQ(orol(&lda), 0);
+    EXPECT_EQ(insert(0), 1);    // the first of its transaction
+    EXPECT_EQ(orol(&lda), 0);
+    numbers[2] = 4;
+    EXPECT_EQ(ocon(&lda), 0);
+    EXPECT_EQ(insert(0), 0);
+    EXPECT_EQ(cda.rpc, 4u);
+    EXPECT_EQ(ocof(&lda), 0);
+    EXPECT_EQ(orol(&lda), 0);
+    EXPECT_EQ(One("select count(*) from t"), 4);
+
+    // Values in pieces: the first row is done when the last one fails; nothing else runs in between.
+    ASSERT_EQ(Parse("insert into t values (5, :c)"), 0);
+    ASSERT_EQ(obindps(&cda, 0, T("c"), -1, reinterpret_cast<ub1*>(&number), 10, SQLT_CHR, -1, nullptr, nullptr, nullptr,
+                      0, 0, 0, 0, 0, nullptr, nullptr, -1, -1), 0);
+    Cda_Def other{};
+    ASSERT_EQ(oopen(&other, &lda, nullptr, -1, -1, nullptr, -1), 0);
+    ub4 length = 3;
+    for (const bool given_up : {false, true}) {
+        EXPECT_EQ(oexn(&cda, 2, 0), 3129);
+        EXPECT_EQ(osetpi(&cda, OCI_ONE_PIECE, T("abc"), &length), 0);
+        EXPECT_EQ(oexn(&cda, 2, 0), 3129);
+        EXPECT_EQ(ocom(&lda), 3127);
+        EXPECT_EQ(oparse(&other, T("delete from t"), -1, 1, 2), 3127);
+        EXPECT_EQ(osetpi(&cda, OCI_ONE_PIECE, T("abc"), &length), 0);
+        EXPECT_EQ(given_up ? ocan(&cda) : oexn(&cda, 2, 0), given_up ? 0 : 1);
+        EXPECT_EQ(ocom(&lda), 0);
+    }
+    EXPECT_EQ(One("select count(*) from t"), 4);
+}
+
+TEST_F(LegacyCalls, LocksAreWaitedForOrNot) {
+    Lda_Def second{};
+    Cda_Def holder{};
+    const std::filesystem::path file =
+        std::filesystem::temp_directory_path() / ("legacy_calls_" + std::to_string(getpid()));
+    if (!server) {
+        EXPECT_EQ(ologof(&lda), 0);
+        database = file;
+        ASSERT_EQ(LogOn(lda), 0);
+        ASSERT_EQ(oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1), 0);
+        ASSERT_EQ(Run("create table t (n integer, c varchar2(10))"), 0);
+    }
+    ASSERT_EQ(Run("insert into t values (1, 'a')"), 0);
+    ASSERT_EQ(ocom(&lda), 0);
+    ASSERT_EQ(LogOn(second), 0);
+    ASSERT_EQ(oopen(&holder, &second, nullptr, -1, -1, nullptr, -1), 0);
+    const auto hold = [&] {
+        EXPECT_EQ(oparse(&holder, T("update t set c = 'b'"), -1, 1, 2), 0);
+        EXPECT_EQ(oexec(&holder), 0);
+    };
+    hold();
+    ASSERT_EQ(Parse("update t set c = 'c' where n = 1"), 0);
+    ASSERT_EQ(oopt(&cda, 2, 4), 0);
+    const auto start = Clock::now();
+    EXPECT_EQ(oexec(&cda), 54);
+    EXPECT_LT(Clock::now() - start, 1s);
+    EXPECT_EQ(orol(&second), 0);
+    EXPECT_EQ(oexec(&cda), 0);
+    EXPECT_EQ(orol(&lda), 0);    // the wish is not taken back with it
+    hold();
+    EXPECT_EQ(oexec(&cda), 54);
+    ASSERT_EQ(oopt(&cda, 2, 0), 0);
+    std::thread releasing([&] {
+        std::this_thread::sleep_for(200ms);
+        EXPECT_EQ(ocom(&second), 0);
+    });
+    EXPECT_EQ(oexec(&cda), 0);
+    releasing.join();
+    EXPECT_EQ(ocom(&lda), 0);
+    EXPECT_EQ(ologof(&second), 0);
+    if (server) return;
+    for (const char* ending : {"", "-wal", "-shm", "-journal"}) std::filesystem::remove(file.string() + ending);
+}
+
+// A session with handles: a context that lends it, or takes it over.
+class LegacyBridges : public LegacyCalls {
+protected:
+    void SetUp() override {
+        LegacyCalls::SetUp();
+        ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), 0);
+        err = static_cast<OCIError*>(New(OCI_HTYPE_ERROR));
+        stmt = static_cast<OCIStmt*>(New(OCI_HTYPE_STMT));
+    }
+    void TearDown() override {
+        EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
+        LegacyCalls::TearDown();
+    }
+    dvoid* New(ub4 type) {
+        dvoid* handle = nullptr;
+        EXPECT_EQ(OCIHandleAlloc(env, &handle, type, 0, nullptr), 0);
+        return handle;
+    }
+    // The number of what a call on the handles answered.
+    sword Number(sword code) {
+        sb4 number = 0;
+        if (code == OCI_SUCCESS || code == OCI_INVALID_HANDLE) return code;
+        OCIErrorGet(err, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
+        return number;
+    }
+    sword ExecuteOn(OCISvcCtx* service, std::string_view sql) {
+        EXPECT_EQ(OCIStmtPrepare(stmt, err, T(sql.data()), static_cast<ub4>(sql.size()), OCI_NTV_SYNTAX, 0), 0);
+        return Number(OCIStmtExecute(service, stmt, err, 1, 0, nullptr, nullptr, 0));
+    }
+    int CountOn(OCISvcCtx* service) {
+        int count = -1;
+        OCIDefine* define = nullptr;
+        EXPECT_EQ(OCIStmtPrepare(stmt, err, T("select count(*) from t"), 22, OCI_NTV_SYNTAX, 0), 0);
+        EXPECT_EQ(OCIDefineByPos(stmt, &define, err, 1, &count, 4, SQLT_INT, nullptr, nullptr, nullptr, 0), 0);
+        EXPECT_EQ(Number(OCIStmtExecute(service, stmt, err, 1, 0, nullptr, nullptr, 0)), 0);
+        return count;
+    }
+
+    OCIEnv* env = nullptr;
+    OCIError* err = nullptr;
+    OCIStmt* stmt = nullptr;
+    OCISvcCtx* none = nullptr;
+};
+
+TEST_F(LegacyBridges, ALoginBecomesAContext) {
+    Fill(3);
+    ASSERT_EQ(onbset(&lda), 0);
+    EXPECT_EQ(OCILdaToSvcCtx(&none, err, &unknown), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCILdaToSvcCtx(&none, err, &cda), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCILdaToSvcCtx(&none, nullptr, &lda), OCI_INVALID_HANDLE);
+    EXPECT_EQ(Number(OCILdaToSvcCtx(nullptr, err, &lda)), 21560);
+    EXPECT_EQ(lda.rc, 21560);
+    OCISvcCtx* taken = nullptr;
+    ASSERT_EQ(OCILdaToSvcCtx(&taken, err, &lda), OCI_SUCCESS);
+    EXPECT_EQ(lda.rc, 0);
+    EXPECT_EQ(ocom(&lda), 1001);
+    EXPECT_EQ(oexec(&cda), 1001);
+    EXPECT_EQ(CountOn(taken), 3);
+    ub1 mode = 0;
+    EXPECT_EQ(OCIAttrGet(taken, OCI_HTYPE_SVCCTX, &mode, nullptr, OCI_ATTR_NONBLOCKING_MODE, err), 0);
+    EXPECT_EQ(mode, 1);
+    EXPECT_EQ(OCITransRollback(taken, err, 0), 0);
+    EXPECT_EQ(CountOn(taken), 0);
+
+    // Another's session moves into the living context, which ends the one that it had.
+    ASSERT_EQ(LogOn(lda), 0);
+    OCISvcCtx* const same = taken;
+    EXPECT_EQ(OCILdaToSvcCtx(&taken, err, &lda), OCI_SUCCESS);
+    EXPECT_EQ(taken, same);
+    EXPECT_EQ(ExecuteOn(taken, "create table made (n integer)"), 0);
+    EXPECT_EQ(OCILogoff(taken, err), 0);
+    ASSERT_EQ(LogOn(lda), 0);
+}
+
+TEST_F(LegacyBridges, AContextLendsItsSession) {
+    OCISvcCtx* service = nullptr;
+    Lda_Def lent{};
+    const auto name = [&](OCISvcCtx** out) {
+        const std::size_t slash = user.find('/');
+        return OCILogon(env, err, out, T(user.c_str()), static_cast<ub4>(server ? slash : 0), T("secret"), server ? 6 : 0,
+                        T(database.c_str()), static_cast<ub4>(database.size()));
+    };
+    auto* const idle = static_cast<OCISvcCtx*>(New(OCI_HTYPE_SVCCTX));
+    EXPECT_EQ(Number(OCISvcCtxToLda(idle, err, &unknown)), 3114);
+    EXPECT_EQ(unknown.rc, 3114);
+    EXPECT_EQ(OCISvcCtxToLda(nullptr, err, &lent), OCI_INVALID_HANDLE);
+    ASSERT_EQ(name(&service), 0);
+    if (!server) {
+        ASSERT_EQ(ExecuteOn(service, "create table t (n integer, c varchar2(10))"), 0);
+    }
+    EXPECT_EQ(Number(OCISvcCtxToLda(service, err, nullptr)), 21560);
+    EXPECT_EQ(Number(OCISvcCtxToLda(service, err, &lda)), 1015);
+    ASSERT_EQ(ExecuteOn(service, "insert into t values (1, null)"), 0);
+    ASSERT_EQ(OCISvcCtxToLda(service, err, &lent), 0);
+    for (const sword number : {Number(OCISvcCtxToLda(service, err, &unknown)), ExecuteOn(service, "delete from t"),
+                               Number(OCITransCommit(service, err, 0)), Number(OCITransRollback(service, err, 0)),
+                               Number(OCIPing(service, err, 0)), Number(OCIBreak(service, err)),
+                               Number(OCILogoff(service, err)), Number(name(&service))}) {
+        EXPECT_EQ(number, 24406);
+    }
+    EXPECT_EQ(ologof(&lent), 1010);
+    Cda_Def cursor{};
+    int count = 0;
+    ASSERT_EQ(oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1), 0);
+    ASSERT_EQ(oparse(&cursor, T("insert into t values (2, null)"), -1, 1, 2), 0);
+    EXPECT_EQ(oexec(&cursor), 0);
+    ASSERT_EQ(oparse(&cursor, T("select count(*) from t"), -1, 1, 2), 0);
+    ASSERT_EQ(odefin(&cursor, 1, reinterpret_cast<ub1*>(&count), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1, nullptr,
+                     nullptr), 0);
+    EXPECT_EQ(oexfet(&cursor, 1, 0, 0), 0);
+    EXPECT_EQ(count, 2);
+    OCISvcCtx* back = nullptr;
+    EXPECT_EQ(OCILdaToSvcCtx(&back, err, &lent), 0);
+    EXPECT_EQ(back, service);
+    EXPECT_EQ(oexec(&cursor), 1001);
+    EXPECT_EQ(CountOn(service), 2);
+    EXPECT_EQ(OCITransRollback(service, err, 0), 0);
+    EXPECT_EQ(CountOn(service), 0);
+    // The end of the context is the end of the login.
+    ASSERT_EQ(OCISvcCtxToLda(service, err, &lent), 0);
+    ASSERT_EQ(oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1), 0);
+    if (server) {    // which waits for what is left unfinished
+        ASSERT_EQ(oparse(&cursor, T("select pg_sleep(0.5)"), -1, 1, 2), 0);
+        ASSERT_EQ(onbset(&lent), 0);
+        EXPECT_EQ(oexec(&cursor), 3123);
+        EXPECT_EQ(Number(OCILdaToSvcCtx(&back, err, &lent)), 3127);
+    }
+    EXPECT_EQ(OCIHandleFree(service, OCI_HTYPE_SVCCTX), 0);
+    EXPECT_EQ(oexec(&cursor), 1001);
+    EXPECT_EQ(ocom(&lent), 1001);
+}
+
+// What an engine can leave unfinished is repeated until it is done; the embedded one ends every call.
+TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
+    Fill(5);
+    ASSERT_EQ(onbset(&lda), 0);
+    int waits = 0;
+    const auto finish = [&waits](auto call) {
+        sword result = call();
+        for (waits = 0; result == 3123; ++waits) result = call();
+        return result;
+    };
+    int value = 0;
+    if (server) {
+        ASSERT_EQ(Parse("select n from (select 7 as n, pg_sleep(0.3)) s"), 0);
+    } else {
+        ASSERT_EQ(Parse("select max(n) + 2 from t"), 0);
+    }
+    ASSERT_EQ(Define(1, &value, 4, SQLT_INT), 0);
+    sword result = oexec(&cda);
+    EXPECT_EQ(result, server ? 3123 : 0);
+    if (server) {
+        Cda_Def other{};
+        EXPECT_EQ(cda.v2_rc, -3123);
+        EXPECT_EQ(ofetch(&cda), 3127);
+        EXPECT_EQ(ocan(&cda), 3127);
+        EXPECT_EQ(oclose(&cda), 3127);
+        EXPECT_EQ(oopen(&other, &lda, nullptr, -1, -1, nullptr, -1), 3127);
+        for (auto* call : {ocom, orol, ologof, onbclr, onbtst}) EXPECT_EQ(call(&lda), 3127);
+        OCISvcCtx* none = nullptr;
+        EXPECT_EQ(OCILdaToSvcCtx(&none, nullptr, &lda), OCI_INVALID_HANDLE);
+        EXPECT_EQ(finish([&] { return oexec(&cda); }), 0);
+        EXPECT_GT(waits, 5);
+    }
+    EXPECT_EQ(finish([&] { return ofetch(&cda); }), 0);
+    EXPECT_EQ(value, 7);
+    EXPECT_EQ(finish([&] { return ofetch(&cda); }), 1403);
+    EXPECT_EQ(cda.rpc, 1u);
+
+    std::array<int, 5> numbers{};
+    ASSERT_EQ(Parse("select n from t order by n"), 0);
+    ASSERT_EQ(Define(1, numbers.data(), 4, SQLT_INT), 0);
+    EXPECT_EQ(finish([&] { return oexfet(&cda, 5, 0, 1); }), 0);
+    EXPECT_EQ(numbers, (std::array{1, 2, 3, 4, 5}));
+    ASSERT_EQ(Parse("delete from t where n > :n"), 0);
+    number = 3;
+    ASSERT_EQ(Bind("n", &number, 4, SQLT_INT), 0);
+    EXPECT_EQ(finish([&] { return oexn(&cda, 1, 0); }), 0);
+    EXPECT_EQ(cda.rpc, 2u);
+    ASSERT_EQ(Parse("select 1 / 0 from t"), 0);
+    if (server) {
+        EXPECT_EQ(finish([&] { return oexec(&cda); }), 1476);
+    }
+}
+
+TEST_F(LegacyCalls, ABreakEndsTheCallOnce) {
+    const char* const kLong = server ? "select count(pg_sleep(20)) from t"
+                                     : "with recursive r(n) as (select 1 union all select n + 1 from r) select count(*) from r";
+    Fill(1);
+    for (const bool blocks : {true, false}) {
+        ASSERT_EQ((blocks ? onbclr : onbset)(&lda), 0);
+        ASSERT_EQ(Parse(kLong), 0);
+        ASSERT_EQ(Define(1, &number, 4, SQLT_INT), 0);
+        std::thread stopping([&] {
+            std::this_thread::sleep_for(100ms);
+            EXPECT_EQ(obreak(&lda), 0);
+        });
+        const auto start = Clock::now();
+        sword result = 3123;
+        while (result == 3123) result = oexfet(&cda, 1, 0, 0);
+        EXPECT_EQ(result, 1013);
+        EXPECT_LT(Clock::now() - start, 10s);
+        stopping.join();
+        ASSERT_EQ(onbclr(&lda), 0);
+        EXPECT_EQ(One("select count(*) from t"), 1);
+    }
+    // Where none runs, the next one.
+    EXPECT_EQ(obreak(&lda), 0);
+    ASSERT_EQ(Parse("select n from t"), 0);
+    EXPECT_EQ(oexec(&cda), 1013);
+    EXPECT_EQ(oexec(&cda), 0);
+}
+
+// Logins share nothing.
+TEST_F(LegacyCalls, AreasInTwoThreads) {
+    AtOnce(4, [&](int thread) {
+        std::array<ub1, HDA_SIZE> own_host{};
+        Lda_Def login{};
+        Cda_Def cursor{};
+        int sum = 0;
+        EXPECT_EQ(olog(&login, own_host.data(), T(user.c_str()), -1, nullptr, 0, T(database.c_str()), -1, thread % 2), 0);
+        EXPECT_EQ(oopen(&cursor, &login, nullptr, -1, -1, nullptr, -1), 0);
+        for (int round = 0; round < 20; ++round) {
+            int value = 0;
+            EXPECT_EQ(oparse(&cursor, T("select 1 + :n from dual"), -1, 1, 2), 0);
+            EXPECT_EQ(obndrv(&cursor, T(":n"), -1, reinterpret_cast<ub1*>(&round), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1), 0);
+            EXPECT_EQ(odefin(&cursor, 1, reinterpret_cast<ub1*>(&value), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1,
+                             nullptr, nullptr), 0);
+            sword result = 3123;
+            while (result == 3123) result = oexfet(&cursor, 1, 0, 1);
+            EXPECT_EQ(result, 0);
+            sum += value;
+        }
+        EXPECT_EQ(sum, 210);
+        EXPECT_EQ(oclose(&cursor), 0);
+        EXPECT_EQ(ologof(&login), 0);
+    });
 }
 
 }  // namespace
