@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "client_work.h"
+#include "legacy_work.h"
 #include "oci.h"
 
 namespace {
@@ -341,6 +342,12 @@ void Run(const std::string& folder, int runs) {
     const auto all = [](ub8 rows) { if (rows != kRows) Fail("not every row came back"); };
     Pair("array define of 200,000 rows by 1,000 / bare loop", 2.0, runs,
          [&] { all(FetchThroughLibrary(session)); }, [&] { all(FetchBare(bare)); });
+    const std::string cursors = folder + "/cursors.db";
+    Pair("oexn of 200,000 rows by 1,000 / OCIStmtExecute", 1.1, runs, [&] { Remove(cursors); InsertThroughCursor(cursors); },
+         [&] { Remove(cursors); InsertThroughLibrary(cursors); });
+    CursorSession cursor(ours);
+    Pair("ofen of 200,000 rows by 1,000 / OCIStmtFetch2", 1.1, runs, [&] { all(FetchThroughCursor(cursor)); },
+         [&] { all(FetchThroughLibrary(session)); });
     const ub8 bytes = PiecesBare(bare);
     const auto whole = [bytes](ub8 fetched) { if (fetched != bytes) Fail("not every byte came back"); };
     Pair("pieces of 200,000 rows by callback / bare loop", 3.0, runs,

@@ -7,6 +7,7 @@
 #include <cstdlib>
 
 #include "client_work.h"
+#include "legacy_work.h"
 #include "xa.h"
 
 namespace {
@@ -133,6 +134,18 @@ void Measure(int runs) {
     Session session(url);
     Pair("PostgreSQL: fetch into arrays / single-row mode", 1.5, runs, [&] { FetchThroughLibrary(session); },
          [&] { FetchBare(bare); });
+    Pair("PostgreSQL: oexn / OCIStmtExecute", 1.1, runs,
+         [&] {
+             bare.Run("drop table if exists t");
+             InsertThroughCursor(url);
+         },
+         [&] {
+             bare.Run("drop table if exists t");
+             InsertThroughLibrary(url);
+         });
+    CursorSession cursor(url);
+    Pair("PostgreSQL: ofen / OCIStmtFetch2", 1.1, runs, [&] { FetchThroughCursor(cursor); },
+         [&] { FetchThroughLibrary(session); });
     Pair("PostgreSQL: OCIPing / empty query", 1.2, runs,
          [&] {
              for (int trip = 0; trip < kTrips; ++trip) session.Check(OCIPing(session.svc, session.err, OCI_DEFAULT));

@@ -18,8 +18,8 @@ enum class Function : ub1 {
 };
 
 // What a call on the handles answered, as a number; it is kept for oerhms. 3129 or 3130 is for the caller to tell.
-int Outcome(sword code, OCIError* error, Login& login);
-int Outcome(sword code, Cursor& cursor);    // notes values that were cut, too
+int Outcome(sword code, OCIError* error, Login& login) noexcept;
+int Outcome(sword code, Cursor& cursor) noexcept;    // notes values that were cut, too
 
 template <class Body>
 int Guarded(Body&& body) noexcept try {

@@ -81,6 +81,16 @@ int MakeLogin(Lda_Def* area, bool has_host_area, TextArgument user, TextArgument
     return result;
 }
 
+// Without memory for the engine's words there are none.
+void NoteMessage(Login& login, int number, const char* message) noexcept {
+    login.last_error = 0;
+    try {
+        login.last_message = message;
+        login.last_error = number;
+    } catch (const std::bad_alloc&) {
+    }
+}
+
 bool IsGone(int number) { return number == errors::kNotLoggedOn || number == errors::kNotConnected; }
 
 void Put(std::string_view message, text* buffer, std::size_t size) {
@@ -91,7 +101,7 @@ void Put(std::string_view message, text* buffer, std::size_t size) {
 
 }  // namespace
 
-int Outcome(sword code, OCIError* error, Login& login) {
+int Outcome(sword code, OCIError* error, Login& login) noexcept {
     if (code == OCI_SUCCESS) return 0;
     if (code == OCI_NO_DATA) return errors::kNoRows;
     if (code == OCI_NEED_DATA) return errors::kWantsPiece;
@@ -102,14 +112,12 @@ int Outcome(sword code, OCIError* error, Login& login) {
         return code == OCI_SUCCESS_WITH_INFO ? 0 : errors::kInternalError;
     }
     if (code == OCI_SUCCESS_WITH_INFO) return number == errors::kTruncationWarning ? errors::kTruncationWarning : 0;
-    login.last_error = 0;
-    login.last_message = reinterpret_cast<const char*>(message);
-    login.last_error = number;
+    NoteMessage(login, number, reinterpret_cast<const char*>(message));
     if (number == errors::kNotPrepared) return errors::kNotParsed;
     return number == errors::kNotExecuted ? errors::kFetchOutOfSequence : number;
 }
 
-int Outcome(sword code, Cursor& cursor) {
+int Outcome(sword code, Cursor& cursor) noexcept {
     const int result = Outcome(code, cursor.error, *cursor.login);
     if (result != errors::kTruncationWarning) return result;
     cursor.truncated = true;
@@ -159,10 +167,11 @@ sword DescribeProcedure(Lda_Def* area, const text* name, ub4* count) {
 sword LogOff(Lda_Def* area) {
     return OnLogin(area, [area](Login& login) -> int {
         if (login.lender) return errors::kInvalidCall;
+        std::vector<std::shared_ptr<Cursor>> cursors;
+        cursors.reserve(CountCursors(login));    // nothing fails once the session has ended
         const int result =
             login.borrowed ? 0 : Outcome(OCILogoff(login.service, login.error), login.error, login);
         if (result != 0 && !IsGone(result)) return result;
-        std::vector<std::shared_ptr<Cursor>> cursors;
         (void)ForgetLogin(area, cursors);
         for (const auto& cursor : cursors) cursor->ended = true;
         login.ended = true;

@@ -5,6 +5,7 @@
 #include <limits>
 
 #include "legacy/cursors.h"
+#include "legacy/options.h"
 #include "legacy/types.h"
 
 namespace legacy {
@@ -37,6 +38,7 @@ template <class Handle>
 int Finish(Cursor& cursor, Handle* handle, ub4 kind, const Place& place, const Steps* steps,
            sword (*set_steps)(Handle*, OCIError*, ub4, ub4, ub4, ub4)) {
     cursor.waits = Cursor::Waits::no;
+    GiveUpExecute(cursor);
     if (steps && steps->opcode == kInPieces) {
         cursor.pieces[handle] = {place.value, place.indicator, place.codes, steps->indicator, steps->code};
     } else if (steps) {

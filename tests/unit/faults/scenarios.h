@@ -13,11 +13,12 @@ std::span<const Scenario> StatementScenarios();
 std::span<const Scenario> FetchScenarios();
 std::span<const Scenario> LobScenarios();
 std::span<const Scenario> PackageScenarios();
+std::span<const Scenario> LegacyScenarios();
 
 inline std::vector<Scenario> AllScenarios() {
     std::vector<Scenario> all;
     for (const auto& list : {HandleScenarios(), StatementScenarios(), FetchScenarios(), LobScenarios(),
-                             PackageScenarios()}) {
+                             PackageScenarios(), LegacyScenarios()}) {
         all.insert(all.end(), list.begin(), list.end());
     }
     return all;
