@@ -94,14 +94,12 @@ int ParseText(Cursor& cursor, Cda_Def& area, std::string_view sql, bool deferred
 
 // ---- Running
 
-sword ColumnCount(const Cursor& cursor) { return static_cast<sword>(Attribute<ub4>(cursor, OCI_ATTR_PARAM_COUNT)); }
-
 // A query opens; a column that is defined must be there.
 int Opened(Cursor& cursor) {
     cursor.has_result = true;
-    if (cursor.highest_define <= ColumnCount(cursor)) return 0;
-    EndResult(cursor);
-    return errors::kNoSuchColumn;
+    const int failed = CheckColumn(cursor, cursor.highest_define);
+    if (failed != 0) EndResult(cursor);
+    return failed;
 }
 
 // The engine's row number, of the row that a change of one touched.
@@ -167,7 +165,7 @@ int FetchExactly(Cursor& cursor, Cda_Def& area, ub4 rows) {
             NoteOffset(cursor, area);
             return failed;
         }
-        if (!cursor.has_result && cursor.highest_define > ColumnCount(cursor)) return errors::kNoSuchColumn;
+        if (const int failed = CheckColumn(cursor, cursor.highest_define)) return failed;
     }
     int result = RunStatement(cursor, rows, 0, RunMode(cursor) | OCI_EXACT_FETCH);
     area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROWS_FETCHED);
@@ -189,24 +187,34 @@ int RunAndFetch(Cursor& cursor, Cda_Def& area, sword rows, bool cancel) {
 
 // ---- Describing
 
-template <class Value>
-Value ColumnAttribute(dvoid* column, const Cursor& cursor, ub4 attribute) {
-    Value value = 0;
-    (void)OCIAttrGet(column, OCI_DTYPE_PARAM, &value, nullptr, attribute, cursor.error);
-    return value;
-}
+// A column of the select list, and the first that went wrong in asking for what it is.
+struct DescribedColumn {
+    explicit DescribedColumn(Cursor& of) : cursor(of) {}
+    ~DescribedColumn() { if (column) (void)OCIDescriptorFree(column, OCI_DTYPE_PARAM); }
+    DescribedColumn(const DescribedColumn&) = delete;
+    DescribedColumn& operator=(const DescribedColumn&) = delete;
 
-template <class To, class From>
-void Put(To* place, From value) {
-    if (place) *place = static_cast<To>(value);
-}
+    void Get(ub4 attribute, dvoid* value, ub4* length = nullptr) {
+        if (failed == 0) failed = Outcome(OCIAttrGet(column, OCI_DTYPE_PARAM, value, length, attribute, cursor.error), cursor);
+    }
+    template <class Value, class To>
+    void Put(To* place, ub4 attribute) {
+        Value value = 0;
+        if (place) Get(attribute, &value);
+        if (place) *place = static_cast<To>(value);
+    }
+
+    Cursor& cursor;
+    dvoid* column = nullptr;
+    int failed = 0;
+};
 
 // The name is cut to the room announced, and not terminated.
-void PutName(dvoid* column, const Cursor& cursor, const ColumnPlaces& places) {
+void PutName(DescribedColumn& column, const ColumnPlaces& places) {
     OraText* name = nullptr;
     ub4 length = 0;
     if (!places.name_length) return;
-    if (OCIAttrGet(column, OCI_DTYPE_PARAM, &name, &length, OCI_ATTR_NAME, cursor.error) != OCI_SUCCESS) length = 0;
+    column.Get(OCI_ATTR_NAME, &name, &length);
     const sb4 room = std::max(*places.name_length, sb4{0});
     if (places.name) length = std::min(length, static_cast<ub4>(room));
     if (places.name && length > 0) std::memcpy(places.name, name, length);
@@ -218,20 +226,20 @@ int DescribeColumn(Cursor& cursor, Cda_Def& area, sword position, const ColumnPl
         NoteOffset(cursor, area);
         return failed;
     }
-    dvoid* column = nullptr;
-    if (!cursor.is_query || position < 1 ||
-        OCIParamGet(cursor.statement, OCI_HTYPE_STMT, cursor.error, &column, static_cast<ub4>(position)) != OCI_SUCCESS) {
-        return errors::kNoSuchColumn;
-    }
-    Put(places.size, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DATA_SIZE));
-    Put(places.type, ColumnAttribute<ub2>(column, cursor, OCI_ATTR_DATA_TYPE));
-    Put(places.display_size, ColumnAttribute<ub4>(column, cursor, OCI_ATTR_DISP_SIZE));
-    Put(places.precision, ColumnAttribute<sb2>(column, cursor, OCI_ATTR_PRECISION));
-    Put(places.scale, ColumnAttribute<sb1>(column, cursor, OCI_ATTR_SCALE));
-    Put(places.null_ok, ColumnAttribute<ub1>(column, cursor, OCI_ATTR_IS_NULL) != 0 ? 1 : 0);
-    PutName(column, cursor, places);
-    (void)OCIDescriptorFree(column, OCI_DTYPE_PARAM);
-    return 0;
+    if (!cursor.is_query || position < 1) return errors::kNoSuchColumn;
+    if (const int failed = CheckColumn(cursor, position)) return failed;
+    DescribedColumn column(cursor);
+    column.failed = Outcome(OCIParamGet(cursor.statement, OCI_HTYPE_STMT, cursor.error, &column.column,
+                                        static_cast<ub4>(position)), cursor);
+    if (column.failed != 0) return column.failed;
+    column.Put<ub2>(places.size, OCI_ATTR_DATA_SIZE);
+    column.Put<ub2>(places.type, OCI_ATTR_DATA_TYPE);
+    column.Put<ub4>(places.display_size, OCI_ATTR_DISP_SIZE);
+    column.Put<sb2>(places.precision, OCI_ATTR_PRECISION);
+    column.Put<sb1>(places.scale, OCI_ATTR_SCALE);
+    column.Put<ub1>(places.null_ok, OCI_ATTR_IS_NULL);
+    PutName(column, places);
+    return column.failed;
 }
 
 // What a cursor waits for goes with it; the register has let it go.
@@ -248,6 +256,14 @@ int Compile(Cursor& cursor) {
     cursor.compiled = result == 0;
     cursor.described = cursor.compiled && cursor.is_query;
     return result;
+}
+
+int CheckColumn(Cursor& cursor, sword position) {
+    ub4 columns = 0;
+    const int failed = Outcome(OCIAttrGet(cursor.statement, OCI_HTYPE_STMT, &columns, nullptr, OCI_ATTR_PARAM_COUNT,
+                                          cursor.error),
+                               cursor);
+    return failed == 0 && position > static_cast<sword>(columns) ? errors::kNoSuchColumn : failed;
 }
 
 sword OpenCursor(Cda_Def* area, Lda_Def* login_area) {

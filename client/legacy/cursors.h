@@ -71,5 +71,6 @@ struct Part {
 sword ReadPart(Cda_Def* area, sword position, const Part& part);
 // Gets the columns of a query that is compiled.
 int Compile(Cursor& cursor);
+int CheckColumn(Cursor& cursor, sword position);    // 1007 when it is past the last one of those
 
 }  // namespace legacy

@@ -108,11 +108,14 @@ int Outcome(sword code, OCIError* error, Login& login) noexcept {
     if (code == OCI_INVALID_HANDLE) return errors::kNotLoggedOn;    // freed behind the login
     sb4 number = 0;
     OraText message[1024];
-    if (OCIErrorGet(error, 1, nullptr, &number, message, sizeof message, OCI_HTYPE_ERROR) != OCI_SUCCESS) {
+    const sword found = OCIErrorGet(error, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
+    if (found == OCI_ERROR) return errors::kOutOfMemory;    // for the record
+    if (found != OCI_SUCCESS) {
         return code == OCI_SUCCESS_WITH_INFO ? 0 : errors::kInternalError;
     }
     if (code == OCI_SUCCESS_WITH_INFO) return number == errors::kTruncationWarning ? errors::kTruncationWarning : 0;
-    NoteMessage(login, number, reinterpret_cast<const char*>(message));
+    const sword told = OCIErrorGet(error, 1, nullptr, nullptr, message, sizeof message, OCI_HTYPE_ERROR);
+    NoteMessage(login, number, told == OCI_SUCCESS ? reinterpret_cast<const char*>(message) : "");
     if (number == errors::kNotPrepared) return errors::kNotParsed;
     return number == errors::kNotExecuted ? errors::kFetchOutOfSequence : number;
 }

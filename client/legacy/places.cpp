@@ -68,10 +68,8 @@ int Bind(Cursor& cursor, Name name, Place place, Table table, const Steps* steps
 int DefineColumn(Cursor& cursor, sword position, Place place, const Steps* steps) {
     if (position < 1 || position > kMostColumns) return errors::kNoSuchColumn;
     if (cursor.compiled || cursor.has_result) {
-        ub4 columns = 0;
         if (const int failed = Compile(cursor)) return failed;
-        (void)OCIAttrGet(cursor.statement, OCI_HTYPE_STMT, &columns, nullptr, OCI_ATTR_PARAM_COUNT, cursor.error);
-        if (static_cast<ub4>(position) > columns) return errors::kNoSuchColumn;
+        if (const int failed = CheckColumn(cursor, position)) return failed;
     }
     ub4 mode = OCI_DEFAULT;
     if (const int failed = Prepare(place, steps, OCI_DYNAMIC_FETCH, mode)) return failed;

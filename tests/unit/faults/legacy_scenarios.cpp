@@ -111,7 +111,7 @@ void UndoneWhole(World& w) {
             Number(w, "oexn", [&] { return oexn(&areas->cursor, rows, 0); }, {rows == 4 ? 1 : 0});
         } catch (const Stopped&) {
             EXPECT_EQ(areas->cursor.rpc, 0u);
-            EXPECT_EQ(Count(*areas), 1);
+            EXPECT_LE(Count(*areas), 1);    // 0: the engine had to roll the transaction back
             throw;
         }
         w.See(areas->cursor.rpc);
@@ -131,7 +131,8 @@ void UndoneWhole(World& w) {
         Number(w, "oexn", [&] { return oexn(&areas->cursor, 2, 0); }, {1});
     } catch (const Stopped&) {
         EXPECT_EQ(ocan(&areas->cursor), 0);
-        EXPECT_EQ(Count(*areas), 4);
+        const int left = Count(*areas);
+        EXPECT_TRUE(left == 4 || left == 0) << left;
         throw;
     }
     w.See(Count(*areas));
