@@ -2,6 +2,7 @@
 #include "legacy/areas.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <new>
 #include <unordered_map>
 
@@ -13,7 +14,7 @@
 namespace legacy {
 namespace {
 
-// Never destroyed: calls may come while the process ends.
+// Never destroyed: calls may come while the process ends. Needs no memory to be there.
 struct Register {
     std::mutex mutex;
     std::unordered_map<const void*, std::shared_ptr<Login>> logins;
@@ -21,7 +22,8 @@ struct Register {
 };
 
 Register& Known() {
-    static auto* const known = new Register;
+    alignas(Register) static std::byte room[sizeof(Register)];
+    static auto* const known = new (room) Register;
     return *known;
 }
 
