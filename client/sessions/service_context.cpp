@@ -49,8 +49,8 @@ Status SetCacheSize(ServiceContext& service, const AttributeValue& value) {
     return {};
 }
 
-Status GetInCurrentMode(ServiceContext&, AttributeValue& value) {
-    value.integer = 1;
+Status GetInCurrentMode(ServiceContext& service, AttributeValue& value) {
+    value.integer = service.Lent() ? 0 : 1;
     return {};
 }
 

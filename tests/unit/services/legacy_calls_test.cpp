@@ -565,6 +565,9 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
                                Number(OCILogoff(service, err)), Number(name(&service))}) {
         EXPECT_EQ(number, 24406);
     }
+    ub1 current = 9;
+    EXPECT_EQ(OCIAttrGet(service, OCI_HTYPE_SVCCTX, &current, nullptr, OCI_ATTR_IN_V8_MODE, err), 0);
+    EXPECT_EQ(current, 0);
     EXPECT_EQ(ologof(&lent), 1010);
     Cda_Def cursor{};
     int count = 0;
