@@ -102,7 +102,7 @@ void PgConnection::Note() noexcept {
     if (before && !in_transaction_) {
         lobs_->Forget();
         SomethingUndone();
-        path_may_go_ = false;
+        path_may_go_ = changed_ = false;
     }
     if (in_transaction_) return;
     savepoints_.clear();

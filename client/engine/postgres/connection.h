@@ -107,6 +107,8 @@ public:
     void NoteSavepoint(const SavepointCommand& command);
 
     void Note() noexcept;    // what the server says of the transaction
+    void SomethingUndone() noexcept;      // some of it, or all
+    void NoteChange() noexcept { changed_ = in_transaction_; }    // rows were changed in it
 
     // Names that prepared statements have on this connection, and the end of one.
     std::string NewName();
@@ -123,7 +125,6 @@ public:
 
 private:
     Status SetPath();
-    void SomethingUndone() noexcept;
     [[nodiscard]] std::size_t LastMark() const noexcept;    // its place; the count of savepoints: there is none
     Status Lose(const Status& failure) noexcept;
     Status TellLockWait();
@@ -134,6 +135,7 @@ private:
     Credentials credentials_;
     std::unique_ptr<Wire> wire_;
     bool in_transaction_ = false;
+    bool changed_ = false;              // by what is known of; functions of queries may have done so, too
     struct Savepoint {
         std::string name;         // empty: a mark
         unsigned mark = 0;        // its number, which stands in the server's name for it

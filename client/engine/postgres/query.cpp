@@ -43,12 +43,6 @@ std::uint32_t OffsetOf(std::string_view text, const char* position) {
     return static_cast<std::uint32_t>(at);
 }
 
-std::uint64_t AffectedBy(const PGresult* result) {
-    return std::strtoull(PQcmdTuples(const_cast<PGresult*>(result)), nullptr, 10);
-}
-
-bool Failed(const PGresult* result) { return PQresultStatus(result) == PGRES_FATAL_ERROR; }
-
 Status NoMemory() { return Refused(errors::kOutOfMemory); }
 
 // Whether two more failures can be noted: one, and that there is no room for others.
@@ -175,7 +169,7 @@ Status PgQuery::SendPrepared(const std::string& name, const std::string& text, c
         Result result = server.Next();
         if (server.Broken()) break;
         if (!result) ++command;
-        else if (Failed(result.get())) {
+        else if (IsFailure(result.get())) {
             status = server.Answer(result.get());
             error_offset = OffsetOf(sql_, PQresultErrorField(result.get(), PG_DIAG_STATEMENT_POSITION));
         } else description = std::move(result);
@@ -324,7 +318,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
             if (batch.refusal.Number() == errors::kCancelled) stop = singly;
             if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !connection_.Broken()) continue;
         } else if (row == stop) batch.refusal = PgConnection::Stopped();
-        else if (delivers) batch = RunReturning(source, row, *run.returned);
+        else if (delivers) batch = RunReturning(source, row, last, *run.returned);
         else batch = RunBatch(source, row, last, stop == run.last);
         if (batch.refusal.Number() == errors::kCancelled) stop = row + batch.sent;
         Status failure = std::move(batch.failure);
@@ -336,6 +330,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         if (batch.failure.Ok() && (failure.Ok() || batch.done > 0)) {
             outcome.executed += batch.sent;
             outcome.affected += batch.affected;
+            if (batch.affected > 0) connection_.NoteChange();
             if (batch.last_row) outcome.last_row = batch.last_row;
             row += batch.sent;
         }
@@ -387,59 +382,13 @@ void PgQuery::ReadBatch(Batch& batch) noexcept {
         const Result result = server.Next();
         if (server.Broken() && !result) return;
         if (!result) ++batch.done;
-        else if (Failed(result.get())) batch.failure = server.Answer(result.get(), verb_);
+        else if (IsFailure(result.get())) batch.failure = server.Answer(result.get(), verb_);
         else {
             batch.affected += AffectedBy(result.get());
             const int rows = tail_.empty() ? 0 : PQntuples(result.get());
             if (rows > 0) batch.last_row = RowIdOf(PQgetvalue(result.get(), rows - 1, 0));
         }
     }
-}
-
-// One execution with its rows, which the savepoint outlives: what the sink refuses is undone.
-PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t row, RowSink& sink) {
-    Wire& server = connection_.Server();
-    Batch batch;
-    batch.refusal = Load(source, row);
-    if (batch.refusal.Ok() && server.Asked()) batch.refusal = PgConnection::Stopped();
-    batch.refused = !batch.refusal.Ok();
-    if (batch.refused) return batch;
-    batch.sent = 1;
-    const PgConnection::Guard guard = connection_.SendGuard(true);
-    server.SendExecute(name_.c_str(), bound_.Values(), binary_);
-    server.Sync();
-    Result rows;
-    {
-        const Wire::Heeding heeding(server);
-        batch.failure = connection_.PassGuard(guard);
-        while (batch.failure.Ok() && !server.Idle() && !server.Broken()) {
-            Result result = server.Next();
-            if (!result) continue;
-            if (Failed(result.get())) batch.failure = server.Answer(result.get(), verb_);
-            else if (PQresultStatus(result.get()) == PGRES_TUPLES_OK) rows = std::move(result);
-        }
-        Status rest = server.Drain();
-        if (batch.failure.Ok()) batch.failure = std::move(rest);
-    }
-    if (batch.failure.Ok() && rows) {
-        batch.affected = AffectedBy(rows.get());
-        connection_.Note();    // that a transaction has begun
-        batch.failure = Deliver(rows.get(), row, sink);
-    }
-    if (batch.failure.Ok() && guard == PgConnection::Guard::savepoint) batch.failure = connection_.DropGuard();
-    batch.failure = connection_.Settle(guard, std::move(batch.failure));
-    return batch;
-}
-
-Status PgQuery::Deliver(const PGresult* result, std::uint32_t row, RowSink& sink) try {
-    Status status;
-    for (int index = 0; index < PQntuples(result) && status.Ok(); ++index) {
-        status = Fill(result, index);
-        if (status.Ok()) status = sink.Row(row, at_hand_.values);
-    }
-    return status;
-} catch (const std::bad_alloc&) {
-    return NoMemory();
 }
 
 }  // namespace engine::postgres

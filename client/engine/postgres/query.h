@@ -81,7 +81,11 @@ private:
     Batch TryWhole(RowSource& source, std::uint32_t first, std::uint32_t last) noexcept;
     bool MakeWhole();
     void ReadBatch(Batch& batch) noexcept;
-    Batch RunReturning(RowSource& source, std::uint32_t row, RowSink& sink);
+    Batch RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, RowSink& sink);
+    PgConnection::Guard SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, Batch& batch);
+    Status ReadReturning(PgConnection::Guard guard, Batch& batch, std::vector<Result>& results) noexcept;
+    Status UndoRows(std::uint32_t row, const Batch& batch) noexcept;
+    Status ReleaseRows(PgConnection::Guard guard, const Batch& batch) noexcept;
     Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);
 
     Status Start(const QueryRun& run);

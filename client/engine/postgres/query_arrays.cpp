@@ -1,7 +1,6 @@
 // Arrays handed over whole: an insert of nothing but placeholders becomes one statement over arrays of their values, which
 // the server takes twice as fast as single ones. What fails there is done again row by row: it knows which one fails.
 #include <algorithm>
-#include <cstdlib>
 #include <new>
 
 #include "engine/postgres/query.h"
@@ -149,8 +148,8 @@ PgQuery::Batch PgQuery::RunWhole(RowSource& source, std::uint32_t first, std::ui
     while (batch.failure.Ok()) {
         const Result result = server.Next();
         if (!result) break;
-        if (PQresultStatus(result.get()) == PGRES_FATAL_ERROR) batch.failure = server.Answer(result.get(), verb_);
-        else batch.affected = std::strtoull(PQcmdTuples(result.get()), nullptr, 10);
+        if (IsFailure(result.get())) batch.failure = server.Answer(result.get(), verb_);
+        else batch.affected = AffectedBy(result.get());
     }
     Status rest = server.Drain();
     if (batch.failure.Ok()) batch.failure = std::move(rest);

@@ -69,7 +69,8 @@ constexpr int kNoSuchBranch = 24756;
 
 }  // namespace
 
-// A transaction that the server has given no number has changed and locked nothing.
+// A transaction that the server has given no number has changed and locked nothing. One that has changed rows need not be
+// asked about.
 Status PgConnection::Prepare(const Xid& xid, bool& read_only) {
     read_only = false;
     const std::string command = "prepare transaction '" + NameOf(xid) + "'";
@@ -77,9 +78,9 @@ Status PgConnection::Prepare(const Xid& xid, bool& read_only) {
     if (Status status = Enter(); !status.Ok()) return status;
     if (Status settled = lobs_->Settle(); settled.Failed()) return Lose(settled);
     Result number;
-    if (Status status = Ask("select pg_catalog.pg_current_xact_id_if_assigned()::text", {}, number); !status.Ok())
-        return status;
-    if (!in_transaction_ || PQgetisnull(number.get(), 0, 0)) {
+    Status asked = changed_ ? Status() : Ask("select pg_catalog.pg_current_xact_id_if_assigned()::text", {}, number);
+    if (!asked.Ok()) return asked;
+    if (!in_transaction_ || (!changed_ && PQgetisnull(number.get(), 0, 0))) {
         Status status = Commit();
         read_only = status.Ok();
         return status;

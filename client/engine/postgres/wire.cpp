@@ -111,7 +111,9 @@ Status Wire::Settle() noexcept {
 
 void Wire::OnNotice(void* self, const PGresult* result) noexcept {
     auto& wire = *static_cast<Wire*>(self);
-    if (!wire.notices) return;
+    const char* severity = PQresultErrorField(result, PG_DIAG_SEVERITY_NONLOCALIZED);
+    const bool is_last = severity && (std::strcmp(severity, "FATAL") == 0 || std::strcmp(severity, "PANIC") == 0);
+    if (!wire.notices || is_last) return;    // the call that finds the connection lost tells why
     const char* words = PQresultErrorField(result, PG_DIAG_MESSAGE_PRIMARY);
     try {
         wire.notices->push_back(Warning(kNoticeNumber, words ? words : "").From("POSTGRESQL"));

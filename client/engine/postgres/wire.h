@@ -9,6 +9,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <cstdlib>
 #include <memory>
 #include <span>
 #include <string>
@@ -23,6 +24,11 @@ struct ResultDelete {
     void operator()(PGresult* result) const noexcept { PQclear(result); }
 };
 using Result = std::unique_ptr<PGresult, ResultDelete>;
+
+inline bool IsFailure(const PGresult* result) { return PQresultStatus(result) == PGRES_FATAL_ERROR; }
+inline std::uint64_t AffectedBy(const PGresult* result) {
+    return std::strtoull(PQcmdTuples(const_cast<PGresult*>(result)), nullptr, 10);
+}
 
 // libpq's names of connection parameters and their values; "dbname" may be a URL, which later ones override.
 struct Parameters {

@@ -207,6 +207,34 @@ TEST_P(Contract, ExecutionWhoseRowsAreRefusedIsUndone) {
     EXPECT_EQ(All(), "1;2;3;");
 }
 
+TEST_P(Contract, LongArraysReturnTheirRowsAndFailTheirOwn) {
+    ASSERT_EQ(Run("create table u(n integer primary key)"), 0);
+    const auto insert = Prepared("insert into u values(%1) returning n", std::vector{Integer(1)});
+    Rows rows;
+    rows.rows.clear();
+    for (int row = 0; row < 150; ++row) rows.rows.push_back({Integer(row == 70 ? 5 : row)});
+    for (const bool in_transaction : {false, true}) {
+        for (const bool all_rows : {false, true}) {
+            if (in_transaction) {
+                ASSERT_EQ(Run("insert into u values(1000)"), 0);
+            }
+            Written written;
+            written.refused = 100;    // of row 100, since row 70 has none
+            engine::ArrayOutcome outcome;
+            const engine::ArrayRun run{.first = 0, .last = 150, .all_rows = all_rows, .returned = &written};
+            ASSERT_TRUE(insert->ExecuteArray(rows, run, outcome).Ok());
+            ASSERT_EQ(outcome.failures.size(), all_rows ? 2u : 1u);
+            EXPECT_EQ(outcome.failures[0].row, 70u);
+            EXPECT_EQ(outcome.failures[0].status.Number(), 1);
+            EXPECT_EQ(outcome.failures.back().row, all_rows ? 100u : 70u);
+            EXPECT_EQ(outcome.affected, all_rows ? 148u : 70u);
+            EXPECT_TRUE(written.text.ends_with(all_rows ? "148:148;149:149;" : "68:68;69:69;")) << written.text;
+            EXPECT_EQ(Query("select count(*) from u where n < 1000"), all_rows ? "148;" : "70;");
+            ASSERT_EQ(Answer(connection_->Rollback()), 0);
+        }
+    }
+}
+
 // ---- Transactions
 
 TEST_P(Contract, WhatAStatementDoesBeginsAndEndsTransactions) {

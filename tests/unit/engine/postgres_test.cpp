@@ -82,6 +82,7 @@ TEST_F(Postgres, ServerThatGoesAway) {
     ASSERT_EQ(Answer(connection_->Commit()), 0);
     engine::ArrayOutcome outcome;
     Rows one{{Integer(1)}};
+    Written rows;
     bool flag = false;
     std::uint32_t offset = 0;
     std::unique_ptr<engine::Query> query, insert, made;
@@ -105,9 +106,11 @@ TEST_F(Postgres, ServerThatGoesAway) {
         const int number = Answer(status);
         EXPECT_EQ(number, 3113) << name << ": " << status.Detail();
         EXPECT_EQ(Answer(call()), 3114) << name;
+        query->Close();
+        EXPECT_EQ(Answer(query->Fetch(rows, 1, flag)), 3114) << name;
+        EXPECT_FALSE(connection_->HasNotices()) << "its last words are the error's: " << name;
         EXPECT_TRUE(connection_->Broken()) << name;
         EXPECT_FALSE(connection_->InTransaction()) << name;
-        query->Close();
         query.reset();
         insert.reset();
         connection_ = Connect();
