@@ -143,7 +143,7 @@ TEST_F(Dynamic, ValuesGoInByIteration) {
 
 TEST_F(Dynamic, RowsComeOutByCallbacks) {
     MustRun("create table t(id number, a varchar2(40), b raw(20), c clob)",
-            "insert into t values(1, 'abcdefg', '0102', 'text one'), (2, null, null, null), (3, 'x', 'FF', null)");
+            "insert into t values(1, 'abcdefg', x'0102', 'text one'), (2, null, null, null), (3, 'x', x'FF', null)");
     for (const ub4 rows : {1, 2, 3}) {
         Taker a(3), b(20), c(4);
         sb4 ids[3] = {};

@@ -241,8 +241,8 @@ TEST_F(Fetching, DescriptionOfTheSelectList) {
     MustRun("create table c(n number(10,2), i integer not null, v varchar2(20), f char(3), d date, r raw(16), b clob)");
     ASSERT_EQ(Query("select n, i, v as \"Mixed\", f, d, r, b from c", {}, 0, OCI_DESCRIBE_ONLY), 0);
     const struct { const char* name; ub2 type, size; sb2 precision; sb1 scale; ub1 nullable; } columns[] = {
-        {"N", SQLT_NUM, 22, 10, 2, 1}, {"I", SQLT_NUM, 22, 38, 0, 0}, {"Mixed", SQLT_CHR, 20, 0, 0, 1},
-        {"F", SQLT_AFC, 3, 0, 0, 1}, {"D", SQLT_DAT, 7, 0, 0, 1}, {"R", SQLT_BIN, 16, 0, 0, 1},
+        {"N", SQLT_NUM, 22, 10, 2, 1}, {"I", SQLT_NUM, 22, 38, 0, 0}, {"Mixed", SQLT_CHR, OnServer() ? ub2{80} : ub2{20}, 0, 0, 1},
+        {"F", SQLT_AFC, OnServer() ? ub2{12} : ub2{3}, 0, 0, 1}, {"D", SQLT_DAT, 7, 0, 0, 1}, {"R", SQLT_BIN, OnServer() ? ub2{4000} : ub2{16}, 0, 0, 1},
         {"B", SQLT_CLOB, 4000, 0, 0, 1}};
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_PARAM_COUNT), std::size(columns));
     for (ub4 position = 1; position <= std::size(columns); ++position) {

@@ -102,7 +102,7 @@ TEST_F(Handles, CharacterSets) {
         ub2 length = 0, id = c.id;
         OCIDefine* define = nullptr;
         OCIBind* bind = nullptr;
-        ASSERT_EQ(Prepare("select cast(x'E282AC' as text) from dual"), 0);
+        ASSERT_EQ(Prepare("select '\xE2\x82\xAC' from dual"), 0);
         ASSERT_EQ(Define(&define, 1, {text, 8, SQLT_CHR, nullptr, &length}), 0);
         EXPECT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &id, 0, OCI_ATTR_CHARSET_ID, err)), c.answer) << c.id;
         EXPECT_EQ(Attribute<ub2>(OCI_ATTR_CHARSET_ID, define, OCI_HTYPE_DEFINE), c.answer == 0 ? c.id : 0);

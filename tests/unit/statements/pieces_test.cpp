@@ -95,6 +95,7 @@ TEST_F(PieceByPiece, ThatJustFits) {
         {"''", SQLT_STR, 1, "", 0}, {"''", SQLT_STR, 0, "", 24307}, {"'a'", SQLT_STR, 2, "a", 0},
         {"'a'", SQLT_STR, 1, "#", 24307}, {"''", SQLT_CHR, 0, "", 0}, {"'a'", SQLT_CHR, 1, "a", 0}};
     for (const auto& c : cases) {
+        if (OnServer() && *c.piece == 0) continue;    // '' is null there
         Begin(std::string("select ") + c.value + " from dual", {InPieces(c.type)});
         sword rc = 0;
         EXPECT_EQ(Piece(c.room, rc), c.piece) << c.value << " in " << c.room;
@@ -334,7 +335,7 @@ TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
     }
     ASSERT_EQ(rc, OCI_SUCCESS);
     EXPECT_EQ(RowCount(), 2u);
-    EXPECT_EQ(One("select group_concat(coalesce(a, '-') || ':' || coalesce(hex(b), '-'), '/') from t"),
+    EXPECT_EQ(One("select group_concat(coalesce(a, '-') || ':' || hex(b), '/') from t"),
               "-:/ab:61620063");
 }
 

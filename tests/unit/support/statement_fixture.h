@@ -198,6 +198,7 @@ constexpr const char* kEmbeddedFunctions =
     " $$ select join_texts($1, $2::text) $$;"
     "create aggregate group_concat(numeric) (sfunc = join_numbers, stype = text);"
     "create function hex(bytea) returns text language sql immutable as $$ select upper(encode($1, 'hex')) $$;"
+    "create function hex(text) returns text language sql immutable as $$ select hex(convert_to($1, 'UTF8')) $$;"
     "create function zeroblob(int) returns bytea language sql immutable as $$ select decode(repeat('00', $1), 'hex') $$;"
     "create function printf(text, int, text) returns text language sql immutable as $$ select repeat($3, $2) $$";
 
