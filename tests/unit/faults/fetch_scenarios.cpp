@@ -72,7 +72,8 @@ void FetchArrays(World& w) {
 
 // The rows are read to the end before the other statement writes, and each takes memory of SQLite's: what fails there
 // may lose the transaction, and the change must not go on outside of it.
-void FetchAhead(World& w, ub4 mode) {
+template <ub4 mode>
+void FetchAhead(World& w) {
     EXPECT_EQ(w.One("select count(*) from other"), "0") << "what was rolled back";
     w.Sql("insert into other values(0)");
     w.Keeps("select count(*) from other", "1");
@@ -82,25 +83,16 @@ void FetchAhead(World& w, ub4 mode) {
     w.Execute(0, mode);
     w.Fetch(6);
     rows.Show(w, RowsFetched(w));
-    OCIStmt* const query = w.stmt;
-    const auto write = [&] {
-        w.stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
+    try {
+        const Instead of_query(w.stmt, w.New<OCIStmt>(OCI_HTYPE_STMT));
         w.Run("insert into other values(1)");
         w.Keeps("select count(*) from other", "2");
-    };
-    try {
-        write();
     } catch (const Stopped&) {
-        w.stmt = query;
         ShowRest(w, rows);
         throw;
     }
-    w.stmt = query;
     ShowAll(w, rows);
 }
-
-void FetchAheadOfAWriter(World& w) { FetchAhead(w, OCI_DEFAULT); }
-void ScrollAheadOfAWriter(World& w) { FetchAhead(w, OCI_STMT_SCROLLABLE_READONLY); }
 
 void Scroll(World& w) {
     Rows rows;
@@ -165,9 +157,7 @@ void ManyTypes(World& w) {
     OCIDate date{};
     ub1 seven[7] = {};
     char text[60] = "";
-    static OCIString* string;
-    string = nullptr;
-    w.AtEnd([&w] { return string ? OCIStringResize(w.env, w.err, 0, &string) : OCI_SUCCESS; });
+    OCIString*& string = NewString(w);
     double real = 0;
     auto* stamp = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     auto* rowid = w.NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
@@ -262,8 +252,8 @@ void LongRowsReadAhead(World& w) {
 
 constexpr Scenario kScenarios[] = {
     {"FetchArrays", Ground::session, TableOfRows, FetchArrays, kTwenty},
-    {"FetchAheadOfAWriter", Ground::session, TableOfRows, FetchAheadOfAWriter, kTwenty},
-    {"ScrollAheadOfAWriter", Ground::session, TableOfRows, ScrollAheadOfAWriter, kTwenty},
+    {"FetchAheadOfAWriter", Ground::session, TableOfRows, FetchAhead<OCI_DEFAULT>, kTwenty},
+    {"ScrollAheadOfAWriter", Ground::session, TableOfRows, FetchAhead<OCI_STMT_SCROLLABLE_READONLY>, kTwenty},
     {"Scroll", Ground::session, TableOfRows, Scroll, "1,2,;20,;12,13,14,;1,2,;5,;4,;"},
     {"ExactFetch", Ground::session, TableOfRows, ExactFetch, "18,19,20,"},
     {"PiecesOut", Ground::session, TableOfRows, PiecesOut, "xxxxxx1;xxxxxxxxxxxx2;xxxxxxxxxxxxxxxxxx3;100;"},

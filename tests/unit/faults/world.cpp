@@ -5,6 +5,7 @@
 
 #include <cstdlib>
 #include <filesystem>
+#include <memory>
 
 namespace faults {
 namespace {
@@ -157,6 +158,12 @@ const std::string& World::Folder() {
         folder_ = mkdtemp(name.data());
     }
     return folder_;
+}
+
+OCIString*& NewString(World& w) {
+    const auto string = std::make_shared<OCIString*>(nullptr);
+    w.AtEnd([&w, string] { return *string ? OCIStringResize(w.env, w.err, 0, string.get()) : OCI_SUCCESS; });
+    return *string;
 }
 
 }  // namespace faults

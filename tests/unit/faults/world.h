@@ -8,6 +8,7 @@
 #include <functional>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "faults/allocations.h"
@@ -109,6 +110,10 @@ public:
     std::string One(std::string_view sql);
     // What ends what a step began, undisturbed: called when the scenario is over, the last given first.
     void AtEnd(std::function<sword()> end) { ends_.push_back(std::move(end)); }
+    // What undoes by SQL what a scenario has committed.
+    void CommitAtEnd(std::string_view sql, std::string_view more = "commit") {
+        AtEnd([=, this] { return Sql(sql), Sql(more), Sql("commit"), OCI_SUCCESS; });
+    }
     // What must be in the database from now on, should a step fail; and what, if the record says that the transaction
     // was rolled back.
     void Keeps(std::string_view query, std::string_view value, std::string_view rolled_back = "0") {
@@ -171,6 +176,23 @@ private:
 // A step, or a call that never fails, that goes by the name of its function.
 #define STEP(function, ...) Step(#function, [&] { return function(__VA_ARGS__); })
 #define SURELY(function, ...) Surely(#function, [&] { return function(__VA_ARGS__); })
+
+// Has another handle stand where one of the world's stands, such as its statement, while this lives.
+template <class T>
+class Instead {
+public:
+    Instead(T& place, T other) : place_(place), before_(std::exchange(place, other)) {}
+    ~Instead() { place_ = before_; }
+    Instead(const Instead&) = delete;
+    Instead& operator=(const Instead&) = delete;
+
+private:
+    T& place_;
+    T before_;
+};
+
+// A string of the package that is gone at the end.
+OCIString*& NewString(World& w);
 
 struct Scenario {
     const char* name;
