@@ -70,20 +70,17 @@ TEST(DateToText, Languages) {
         {"GERMAN_AUSTRIA", "DY MON|DAY|MONTH|", "SA MRZ|SAMSTAG   |MÄRZ     |"},
         {"french", "Day|DY|MON|", "Samedi  |SAM.|MARS |"}, {"French", "DL", "samedi 9 mars 2024"},
         {"spanish", "fmDAY|Dy", "SÁBADO|Sáb"}, {"italian", "fmDay DD month", "Sabato 9 marzo"},
-        {"American", "fmDay", "Saturday"},
-    };
+        {"American", "fmDay", "Saturday"}};
     for (const auto& c : cases) EXPECT_EQ(Show(Read("2024-03-09"), c.model, c.language), c.text) << c.language;
     EXPECT_EQ(FindLanguage("klingon"), nullptr);
     EXPECT_EQ(FindLanguage(""), nullptr);
 }
 
 TEST(DateToText, ModelsThatAreRefused) {
-    for (const char* model : {"YYYZ", "\"open", "é", "FF0", "Z", "\x01", "DD\tMM"}) {
+    for (const char* model : {"YYYZ", "\"open", "é", "FF0", "Z", "\x01", "DD\tMM"})
         EXPECT_EQ(Show(Read("2024-03-09"), model), "1821") << model;
-    }
-    for (const char* model : {"FF", "X", "TZH", "TZM", "TZR", "TZD", "FF3"}) {
+    for (const char* model : {"FF", "X", "TZH", "TZM", "TZR", "TZD", "FF3"})
         EXPECT_EQ(Show(Read("2024-03-09"), model, "english", Scope::date), "1821") << model;
-    }
 }
 
 TEST(DateToText, SaysHowMuchRoomItTakes) {
@@ -162,9 +159,8 @@ TEST(DateFromText, Refuses) {
         {"3600 1", "SSSSS MI", 1837}, {"3600 1", "SSSSS SS", 1838}, {"10 +15:00", "HH24 TZH:TZM", 1874},
         {"10 +05:60", "HH24 TZH:TZM", 1875}, {"10 Atlantis", "HH24 TZR", 1882}, {"10 12", "HH24 TZD", 1857},
     };
-    for (const auto& c : cases) {
+    for (const auto& c : cases)
         EXPECT_EQ(Parse(c.text, c.model), std::to_string(c.number)) << c.text << " | " << c.model;
-    }
 }
 
 TEST(DateFromText, MissingFieldsAreOfToday) {

@@ -17,10 +17,9 @@ using namespace date;
 
 TEST(Zone, OffsetsByTheirText) {
     const struct { const char* zone; int minutes; Errno number; } cases[] = {
-        {"+05:30", 330, 0},  {"-08:00", -480, 0}, {"+5", 300, 0},      {"-00:30", -30, 0},   {"+14:00", 840, 0},
-        {"+14:01", 0, 1874}, {"-12:00", -720, 0}, {"-12:01", 0, 1874}, {"-13:00", 0, 1874},  {"+05:60", 0, 1875},
-        {"+", 0, 1857},      {"+a", 0, 1857},     {"+05:", 0, 1857},   {"+05:30x", 0, 1857}, {"+123", 0, 1857},
-    };
+        {"+05:30", 330, 0}, {"-08:00", -480, 0}, {"+5", 300, 0}, {"-00:30", -30, 0}, {"+14:00", 840, 0},
+        {"+14:01", 0, 1874}, {"-12:00", -720, 0}, {"-12:01", 0, 1874}, {"-13:00", 0, 1874}, {"+05:60", 0, 1875},
+        {"+", 0, 1857}, {"+a", 0, 1857}, {"+05:", 0, 1857}, {"+05:30x", 0, 1857}, {"+123", 0, 1857}};
     for (const auto& c : cases) {
         DateTime value = Read("2024-01-01");
         EXPECT_EQ(SetZone(c.zone, &value), c.number) << c.zone;
@@ -161,9 +160,8 @@ TEST(ZoneRules, TextsOfRules) {
 // Bytes flipped and files cut short: refused or read, without harm.
 TEST(ZoneRules, DamagedFiles) {
     const std::string good = FileBytes("/usr/share/zoneinfo/Europe/Paris");
-    for (std::size_t length = 0; length < good.size(); length += 7) {
+    for (std::size_t length = 0; length < good.size(); length += 7)
         EXPECT_FALSE(ZoneRules::FromFile(good.substr(0, length))) << length;
-    }
     std::mt19937 random(1);
     for (int i = 0; i < 3000; ++i) {
         std::string bad = good;

@@ -25,8 +25,7 @@ TEST(Registry, CapacitiesAndMessages) {
         {Kind::result, 650, "lob", "Result"}, {Kind::rowid, 650, "rowid", "Rowid"}, {Kind::file, 650, "file", "File"},
         {Kind::datetime, 650, "datetime", "Datetime"}, {Kind::string, 650, "string", ""}, {Kind::raw, 650, "raw", ""},
         {Kind::mutex, 650, "mutex", "Mutex"}, {Kind::key, 650, "key", "Key"}, {Kind::tid, 650, "tid", "tid"},
-        {Kind::thnd, 650, "thnd", "thnd"},
-    };
+        {Kind::thnd, 650, "thnd", "thnd"}};
     for (const auto& c : cases) {
         const auto name = [](int number) { return "n" + std::to_string(number); };
         for (int number = 0; number < c.capacity; ++number)
@@ -159,11 +158,10 @@ TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
     AsRecord<Kind::lob>(Register(Kind::lob, "arr", array, nullptr))->array_count = 2;
     Register(Kind::lob, "one", &object_b, nullptr);
     const struct { const char* word; void* object; bool is_array; long index; } cases[] = {
-        {"arr[0]", &object_a, false, 0},   {"arr[1]", &object_b, false, 1}, {"arr[2]", array, true, 2},
-        {"arr", array, true, 0},           {"arr[-1]", array, true, -1},    {"arr[1x", &object_b, false, 1},
-        {"arr[]", &object_a, false, 0},    {"one[5]", &object_b, false, 5}, {"one", &object_b, false, 0},
-        {"invalid", InvalidObject(), false, 0},
-    };
+        {"arr[0]", &object_a, false, 0}, {"arr[1]", &object_b, false, 1}, {"arr[2]", array, true, 2},
+        {"arr", array, true, 0}, {"arr[-1]", array, true, -1}, {"arr[1x", &object_b, false, 1},
+        {"arr[]", &object_a, false, 0}, {"one[5]", &object_b, false, 5}, {"one", &object_b, false, 0},
+        {"invalid", InvalidObject(), false, 0}};
     for (const auto& c : cases) {
         const DescriptorReference found = ResolveDescriptor(Kind::lob, c.word);
         EXPECT_EQ(found.object, c.object) << c.word;

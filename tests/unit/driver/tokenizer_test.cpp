@@ -37,8 +37,7 @@ TEST(Tokenizer, SplitsALine) {
         {"\"\"\n", {""}}, {" \t a \t b \t\n", {"a", "b"}}, {"a b # c\n", {"a", "b"}}, {"a b\r\n", {"a", "b"}},
         {"a\vb\n", {"a", "b"}}, {"a \v b\n", {"a", "", "b"}}, {"ab\"c d\"e\n", {"ab\"c", "d\"e"}},
         {"no line end", {"no", "line", "end"}}, {"\xff\x80\x01 \xc3\xa4\n", {"\xff\x80\x01", "\xc3\xa4"}},
-        {"a \"\" b\n", {"a", "", "b"}},
-    };
+        {"a \"\" b\n", {"a", "", "b"}}};
     for (const auto& c : cases) {
         const Tokenized result = Split(c.line);
         EXPECT_EQ(result.words, c.words) << c.line;

@@ -65,8 +65,7 @@ TEST(Values, TextsStoredAndShown) {
         {SQLT_DAT, 7, "2023-02-29-13:05:00", 7, 7, "Invalid date found\n"},
         {SQLT_DAT, 7, "2024-12-31", 7, 7, "\"2024-12-31-00:00:00\"\n"},
         {SQLT_ODT, 8, "1999-01-02-03:04:60", 8, 8, "1999-01-02-03:04:60\n"},
-        {SQLT_ODT, 8, "1999-01-02-03:04:61", 8, 8, "1999-01-02-03:04:61\nInvalid OCITimeSS - 61\n"},
-    };
+        {SQLT_ODT, 8, "1999-01-02-03:04:61", 8, 8, "1999-01-02-03:04:61\nInvalid OCITimeSS - 61\n"}};
     for (const auto& c : cases) {
         Element element(c.type, c.size);
         EXPECT_EQ(element.Assign(c.word, c.given), "") << c.type << " " << c.word;
@@ -78,12 +77,10 @@ TEST(Values, TextsStoredAndShown) {
 
 TEST(Values, AWordThatIsNoValueChangesNothing) {
     const struct { int type; uint32_t size; const char* word; } cases[] = {
-        {SQLT_INT, 1, "128"},      {SQLT_INT, 4, "12x"},         {SQLT_INT, 4, ""},
-        {SQLT_UIN, 4, "-1"},       {SQLT_FLT, 8, "one"},         {SQLT_FLT, 2, "1"},
-        {SQLT_BIN, 5, "X'0'"},     {SQLT_VBI, 8, "X'0G'"},       {SQLT_DAT, 7, "yesterday"},
-        {SQLT_ODT, 8, "-1-1-1"},   {SQLT_CLOB, 8, "no_such_lob"}, {SQLT_RSET, 8, "no_such_result"},
-        {SQLT_BFLOAT, 8, "1.2.3"}, {SQLT_BFLOAT, 8, "1E400"},    {SQLT_TIME, 8, "12:00:00"},
-    };
+        {SQLT_INT, 1, "128"}, {SQLT_INT, 4, "12x"}, {SQLT_INT, 4, ""}, {SQLT_UIN, 4, "-1"}, {SQLT_FLT, 8, "one"},
+        {SQLT_FLT, 2, "1"}, {SQLT_BIN, 5, "X'0'"}, {SQLT_VBI, 8, "X'0G'"}, {SQLT_DAT, 7, "yesterday"},
+        {SQLT_ODT, 8, "-1-1-1"}, {SQLT_CLOB, 8, "no_such_lob"}, {SQLT_RSET, 8, "no_such_result"},
+        {SQLT_BFLOAT, 8, "1.2.3"}, {SQLT_BFLOAT, 8, "1E400"}, {SQLT_TIME, 8, "12:00:00"}};
     for (const auto& c : cases) {
         Element element(c.type, c.size);
         const std::string before = element.Bytes(sizeof element.data);
@@ -135,12 +132,10 @@ TEST(Values, WhatFollowsTheFrame) {
 // Lengths that the library returned, or prefixes in the data, may say more than there is.
 TEST(Values, LengthsAreNotFollowedPastTheElement) {
     const struct { int type; uint32_t size; const char* shown; } cases[] = {
-        {SQLT_CHR, 2, "\"\xFF\xFF\"\n"},     {SQLT_STR, 2, "\"\xFF\xFF\"\n"}, {SQLT_BIN, 2, "\"FFFF\"\n"},
-        {SQLT_VCS, 4, "\"\xFF\xFF\"\n"},     {SQLT_VCS, 1, "\"\"\n"},         {SQLT_VBI, 3, "\"FF\"\n"},
-        {SQLT_LVC, 6, "\"\"\n"},             {SQLT_FLT, 2, "0.000000\n"},     {SQLT_DAT, 7, "Invalid date found\n"},
-        {SQLT_DAT, 3, "Invalid date found\n"}, {SQLT_CUR, 8, "Non null value\n"}, {SQLT_RSET, 0, "Null value\n"},
-        {SQLT_RDD, 8, "RID\n"},
-    };
+        {SQLT_CHR, 2, "\"\xFF\xFF\"\n"}, {SQLT_STR, 2, "\"\xFF\xFF\"\n"}, {SQLT_BIN, 2, "\"FFFF\"\n"},
+        {SQLT_VCS, 4, "\"\xFF\xFF\"\n"}, {SQLT_VCS, 1, "\"\"\n"}, {SQLT_VBI, 3, "\"FF\"\n"}, {SQLT_LVC, 6, "\"\"\n"},
+        {SQLT_FLT, 2, "0.000000\n"}, {SQLT_DAT, 7, "Invalid date found\n"}, {SQLT_DAT, 3, "Invalid date found\n"},
+        {SQLT_CUR, 8, "Non null value\n"}, {SQLT_RSET, 0, "Null value\n"}, {SQLT_RDD, 8, "RID\n"}};
     for (const auto& c : cases) {
         Element element(c.type, c.size);
         std::memset(element.data, 0xFF, c.size);
@@ -184,8 +179,7 @@ TEST(Values, SevenByteDatesThatArePossible) {
         {{120, 124, 4, 31, 1, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 0, 1, 1}, "Invalid date found\n"},
         {{120, 124, 1, 1, 25, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 1, 61, 1}, "Invalid date found\n"},
         {{120, 124, 1, 1, 1, 1, 61}, "Invalid date found\n"}, {{119, 100, 2, 29, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"},
-    };
+        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"}};
     for (const auto& c : cases) {
         Element element(SQLT_DAT, 7);
         std::memcpy(element.data, c.bytes, sizeof c.bytes);
@@ -221,8 +215,7 @@ TEST(Values, ElementSizesByType) {
         {"sqlt_rid", 99, 10}, {"sqlt_dat", 99, 7}, {"sqlt_bfloat", 99, 8}, {"sqlt_bdouble", 99, 16},
         {"sqlt_lvb sqlt_cur sqlt_rdd sqlt_clob sqlt_blob sqlt_rset sqlt_vst sqlt_odt sqlt_date", 99, 8},
         {"sqlt_timestamp sqlt_timestamp_tz sqlt_timestamp_ltz", 99, 8},
-        {"sqlt_chr sqlt_str sqlt_lng sqlt_bin sqlt_lbi sqlt_uin sqlt_afc sqlt_time sqlt_time_tz", 3, 3},
-    };
+        {"sqlt_chr sqlt_str sqlt_lng sqlt_bin sqlt_lbi sqlt_uin sqlt_afc sqlt_time sqlt_time_tz", 3, 3}};
     for (const auto& c : cases) {
         std::istringstream types(c.types);
         for (std::string type; types >> type;)

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <memory>
+#include <sstream>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -84,6 +85,14 @@ inline std::string Shown(const Datum& value) {
         }
         default: return std::string(value.Text());
     }
+}
+
+// All that is told of a column.
+inline std::string Told(const engine::Column& column) {
+    std::ostringstream told;
+    told << column.name << " type " << column.type << " size " << column.size << " precision " << int{column.precision}
+         << " scale " << int{column.scale} << (column.nullable ? "" : " not null");
+    return told.str();
 }
 
 // Rows held as they are; one may be refused.
@@ -199,6 +208,22 @@ protected:
         return Execute(*query, rows);
     }
     int Run(std::string_view sql, std::vector<Datum> values = {}) const { return Run(*connection_, sql, values); }
+    template <class... Sql>
+    void MustRun(const Sql&... texts) const {
+        for (const std::string_view sql : {std::string_view(texts)...}) ASSERT_EQ(Run(sql), 0) << sql;
+    }
+    template <class... Sql>
+    void MustCommit(const Sql&... texts) const {
+        MustRun(texts...);
+        ASSERT_EQ(Answer(connection_->Commit()), 0);
+    }
+    // "row:number " for each.
+    static std::string Failures(const engine::ArrayOutcome& outcome) {
+        std::string all;
+        for (const auto& [row, status] : outcome.failures)
+            all += std::to_string(row) + ':' + std::to_string(status.Number()) + ' ';
+        return all;
+    }
 
     // All rows of a query, or those that came before its error.
     std::string Query(engine::Connection& connection, std::string_view sql, std::vector<Datum> values = {}) const {

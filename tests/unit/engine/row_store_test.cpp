@@ -126,9 +126,8 @@ TEST(RowStore, RefusedRowLeavesTheOthers) {
     const Datum last[] = {Integer(-1), Text(text)};
     ASSERT_TRUE(store.Add(last).Ok());
     EXPECT_EQ(At(store, added, 2), "-1;" + text + ';');
-    for (std::uint64_t row = 0; row < added; ++row) {
+    for (std::uint64_t row = 0; row < added; ++row)
         ASSERT_EQ(At(store, row, 2), std::to_string(row) + ';' + text + ';');
-    }
 }
 
 }  // namespace

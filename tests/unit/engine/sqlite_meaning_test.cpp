@@ -163,8 +163,7 @@ TEST_F(SqliteMeaning, WhatCannotBeComparedRightlyIsRefused) {
         {"select id from t where c = 'ab' = c", 933}, {"select id from t where id < 2 = 1", 933},
         {"insert into u(id) select id from t where d = '01-JAN-24' = c", 933},
         {"select id from t natural join u where d = '03-FEB-24'", 932},
-        {"create view y as select id from t where d > 'today'", 1858},
-    };
+        {"create view y as select id from t where d > 'today'", 1858}};
     for (const auto& c : cases) EXPECT_EQ(Run(c.sql), c.number) << c.sql;
     for (const char* right : {"select id from t where id = 1 and (n = 5) or n = 6",
                               "select case when id = 1 then 1 else 2 end from t where id = 1",

@@ -58,29 +58,24 @@ TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
 
 // The same value through a placeholder, as a literal, from a query and by an update.
 TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
-    ASSERT_EQ(
-        Run("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
-            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18))"),
-        0);
-    const struct { const char* column; const char* literal; const char* outcome;
-    } cases[] = {{"n", "'12.345'", "real 12.35"},
-                 {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"}, {"n", "-1000", "error 1438"},
-                 {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"}, {"n", "''", "null"},
-                 {"n", "1.005e2", "real 100.5"}, {"w", "12345", "12300"}, {"w", "99950", "error 1438"},
-                 {"i", "2.5", "3"}, {"i", "' 12 '", "12"},
-                 {"f", "'123456789012345678901234567890.5'", "decimal 123456789012345678901234567890.5"},
-                 {"f", "1e300", "error 1426"}, {"v", "'abc'", "abc"}, {"v", "'abcd'", "error 12899"},
-                 {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"}, {"v", "12", "12"}, {"c", "'ab  '", "ab  "},
-                 {"c", "'abcde'", "error 12899"}, {"c", "'abcd   '", "abcd"},
-                 {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"}, {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"},
-                 {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"}, {"d", "'30-FEB-24'", "error 1839"},
-                 {"d", "'x'", "error 1858"}, {"d", "5", "error 932"},
-                 {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"}, {"r", "'0aFF'", "bytes 2"},
-                 {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 2"},
-                 {"x", "'1.23456789012345678'", "decimal 1.234567890123457"},
-                 {"b", "'any text at all'", "any text at all"}, {"e", "-999999999999999999", "-999999999999999999"},
-                 {"e", "1000000000000000000", "error 1438"},
-                 {"n", "null", "null"}};
+    MustRun("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
+            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18))");
+    const struct { const char* column; const char* literal; const char* outcome; } cases[] = {
+        {"n", "'12.345'", "real 12.35"}, {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"},
+        {"n", "-1000", "error 1438"}, {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"},
+        {"n", "''", "null"}, {"n", "1.005e2", "real 100.5"}, {"w", "12345", "12300"}, {"w", "99950", "error 1438"},
+        {"i", "2.5", "3"}, {"i", "' 12 '", "12"},
+        {"f", "'123456789012345678901234567890.5'", "decimal 123456789012345678901234567890.5"},
+        {"f", "1e300", "error 1426"}, {"v", "'abc'", "abc"}, {"v", "'abcd'", "error 12899"},
+        {"v", "'\xC3\xA4\xC3\xA4'", "error 12899"}, {"v", "12", "12"}, {"c", "'ab  '", "ab  "},
+        {"c", "'abcde'", "error 12899"}, {"c", "'abcd   '", "abcd"}, {"d", "'03-FEB-24'", "time 2024-02-03 00:00:00"},
+        {"d", "'2024-02-03'", "time 2024-02-03 00:00:00"}, {"d", "'2024-02-03 04:05:06.7'", "time 2024-02-03 04:05:06"},
+        {"d", "'30-FEB-24'", "error 1839"}, {"d", "'x'", "error 1858"}, {"d", "5", "error 932"},
+        {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"}, {"r", "'0aFF'", "bytes 2"},
+        {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 2"},
+        {"x", "'1.23456789012345678'", "decimal 1.234567890123457"}, {"b", "'any text at all'", "any text at all"},
+        {"e", "-999999999999999999", "-999999999999999999"}, {"e", "1000000000000000000", "error 1438"},
+        {"n", "null", "null"}};
     for (const auto& c : cases) {
         const std::string column = c.column;
         const std::string literal = c.literal;
@@ -88,20 +83,16 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
         const auto outcome = [&](int error) {
             return error ? "error " + std::to_string(error) + ';' : Query("select " + column + (column == "b" ? " || ''" : "") + " from t");
         };
-        const auto fresh = [&](const char* row) {
-            ASSERT_EQ(Run("delete from t"), 0);
-            ASSERT_EQ(Run(row), 0);
-        };
-        fresh("select 1");
+        MustRun("delete from t");
         EXPECT_EQ(outcome(Run("insert into main.t(" + column + ") values(" + literal + ")")), want) << literal;
-        fresh("select 1");
+        MustRun("delete from t");
         EXPECT_EQ(outcome(Run("insert into t(" + column + ") select " + literal + " where 1 = 1")), want)
             << "query " << literal;
-        fresh("insert into t(n) values(null)");
+        MustRun("delete from t", "insert into t(n) values(null)");
         EXPECT_EQ(outcome(Run("update t set r = null, " + column + " = " + literal + " where 1 = 1")), want)
             << "update " << literal;
         if (literal.front() != '\'') continue;
-        fresh("select 1");
+        MustRun("delete from t");
         const Datum bound = Text(std::string_view(literal).substr(1, literal.size() - 2));
         EXPECT_EQ(outcome(Run("insert into t(" + column + ") values(?1)", {bound})), want) << "bound " << literal;
     }
@@ -114,8 +105,7 @@ TEST_F(Sqlite, StatementsFollowTablesMadeAnew) {
         {"varchar2(20)", "05-FEB-24", 0, 0, "05-FEB-24;"}, {"date", "05-FEB-24", 0, 0, "2024-02-05 00:00:00;"},
         {"varchar2(20)", "no date", 0, 0, "no date;"}, {"number(5,1)", "1.5", 0, 0, "1.5;"},
         {"number(5,1)", "99999.9", 1438, 0, ""}, {"date", "05-XXX-24", 1843, 1843, ""},
-        {"raw(4)", "0a0b", 0, 0, "\n\v;"}, {"date", "06-FEB-24", 0, 0, "2024-02-06 00:00:00;"},
-    };
+        {"raw(4)", "0a0b", 0, 0, "\n\v;"}, {"date", "06-FEB-24", 0, 0, "2024-02-06 00:00:00;"}};
     const auto other = Connect();
     for (engine::Connection* maker : {connection_.get(), other.get()}) {
         std::unique_ptr<engine::Query> insert, query;
@@ -159,9 +149,8 @@ TEST_F(Sqlite, ColumnsAreDescribed) {
                   "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5))"), 0);
     const auto query = Prepared("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
                                "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', count(kelp_date(b )) from t");
-    struct Expected { const char* name; int type; unsigned size; int precision; int scale; bool nullable; };
-    const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false},
-                                 {"Mixed", SQLT_CHR, 20, 0, 0, true}, {"C", SQLT_AFC, 5, 0, 0, true},
+    struct Expected { const char* name; std::uint16_t type; std::uint32_t size; int precision, scale; bool nullable; };
+    const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false}, {"Mixed", SQLT_CHR, 20, 0, 0, true}, {"C", SQLT_AFC, 5, 0, 0, true},
                                  {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true}, {"E", SQLT_NUM, 22, 0, -127, true},
                                  {"F", SQLT_CLOB, 4000, 0, 0, true}, {"G", SQLT_CHR, 0, 0, 0, true},
                                  {"ID", SQLT_NUM, 22, 38, 0, false}, {"H", SQLT_BDOUBLE, 16, 34, -127, true},
@@ -172,13 +161,9 @@ TEST_F(Sqlite, ColumnsAreDescribed) {
     const auto& columns = query->Columns();
     ASSERT_EQ(columns.size(), std::size(expected));
     for (std::size_t index = 0; index < columns.size(); ++index) {
-        const auto& want = expected[index];
-        EXPECT_EQ(columns[index].name, want.name);
-        EXPECT_EQ(columns[index].type, want.type) << want.name;
-        EXPECT_EQ(columns[index].size, want.size) << want.name;
-        EXPECT_EQ(columns[index].precision, want.precision) << want.name;
-        EXPECT_EQ(columns[index].scale, want.scale) << want.name;
-        EXPECT_EQ(columns[index].nullable, want.nullable) << want.name;
+        const auto& [name, type, size, precision, scale, nullable] = expected[index];
+        EXPECT_EQ(Told(columns[index]), Told({name, type, size, 0, static_cast<std::uint8_t>(precision),
+                                              static_cast<std::int8_t>(scale), nullable}));
     }
 }
 
@@ -259,12 +244,10 @@ TEST_F(Sqlite, CallsAreDescribedBeforeTheyRun) {
 }
 
 TEST_F(Sqlite, ErrorsHaveTheirNumbers) {
-    ASSERT_EQ(Run("create table p(id integer primary key, n number not null, u varchar2(9) unique, check (n < 100))"),
-              0);
-    ASSERT_EQ(Run("create table c(p integer references p(id))"), 0);
-    ASSERT_EQ(Run("create table late(p integer references p(id) deferrable initially deferred)"), 0);
-    ASSERT_EQ(Run("insert into p values(1, 1, 'a')"), 0);
-    ASSERT_EQ(Run("insert into c values(1)"), 0);
+    MustRun("create table p(id integer primary key, n number not null, u varchar2(9) unique, check (n < 100))",
+            "create table c(p integer references p(id))",
+            "create table late(p integer references p(id) deferrable initially deferred)",
+            "insert into p values(1, 1, 'a')", "insert into c values(1)");
     const struct { const char* sql; int number; } cases[] = {
         {"insert into p values(1, 1, 'b')", 1}, {"insert into p values(2, 1, 'a')", 1},
         {"insert into p values(2, null, 'b')", 1400}, {"update p set n = null", 1407},
@@ -414,11 +397,10 @@ TEST_F(Sqlite, SessionsOfADatabaseInMemoryShareItsTablesAlone) {
     connection_.reset();
     ASSERT_TRUE(engine::Open(":memory:", database_).Ok());
     connection_ = Connect();
-    ASSERT_EQ(Run("create table kept(n integer primary key, p integer references kept(n))"), 0);
-    ASSERT_EQ(Run("create temp table mine(n integer)"), 0);
-    ASSERT_EQ(Run("create temp view seen as select * from kept"), 0);
-    ASSERT_EQ(Run("create temp trigger g after insert on kept begin delete from kept; end"), 0);
-    ASSERT_EQ(Run("attach '" + folder_ + "/test.db' as other"), 0);
+    MustRun("create table kept(n integer primary key, p integer references kept(n))",
+            "create temp table mine(n integer)", "create temp view seen as select * from kept",
+            "create temp trigger g after insert on kept begin delete from kept; end",
+            "attach '" + folder_ + "/test.db' as other");
     EXPECT_EQ(Query("pragma query_only = 1"), "");
     EXPECT_EQ(Query("pragma foreign_keys = 0"), "");
     connection_.reset();
@@ -435,8 +417,7 @@ TEST_F(Sqlite, SessionsOfADatabaseInMemoryShareItsTablesAlone) {
 }
 
 TEST_F(Sqlite, SchemasAndTheDatabaseAreDescribed) {
-    ASSERT_EQ(Run("create table t(n integer)"), 0);
-    ASSERT_EQ(Run("create temp table t(v varchar2(3))"), 0);
+    MustRun("create table t(n integer)", "create temp table t(v varchar2(3))");
     engine::ObjectDescription object;
     ASSERT_EQ(Answer(connection_->Describe("t", engine::ObjectKind::any, object)), 0);
     EXPECT_EQ(object.schema, "TEMP") << "as SQLite looks for a name";
@@ -447,9 +428,7 @@ TEST_F(Sqlite, SchemasAndTheDatabaseAreDescribed) {
 }
 
 TEST_F(Sqlite, BrokenDatabasesHaveTheirNumbers) {
-    ASSERT_EQ(Run("create table t(n integer, v text)"), 0);
-    ASSERT_EQ(Run("insert into t values(1, 'kept')"), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MustCommit("create table t(n integer, v text)", "insert into t values(1, 'kept')");
     std::unique_ptr<engine::Database> none;
     EXPECT_EQ(Answer(engine::Open(folder_ + "/no/such/folder/x.db", none)), 12154);
     EXPECT_EQ(Answer(engine::Open("postgresql:///x?host=/no/such", none)), 12541);
@@ -480,9 +459,7 @@ int AsNobody(const std::function<int()>& action) {
 }
 
 TEST_F(Sqlite, FileThatCannotBeWrittenIsRead) {
-    ASSERT_EQ(Run("create table t(n integer)"), 0);
-    ASSERT_EQ(Run("insert into t values(1)"), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MustCommit("create table t(n integer)", "insert into t values(1)");
     connection_.reset();
     database_.reset();
     const std::string file = folder_ + "/test.db";

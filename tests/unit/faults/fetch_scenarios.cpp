@@ -25,9 +25,8 @@ struct Rows {
         w.Define(2, {texts, 130, SQLT_STR});
     }
     void Show(World& w, std::size_t count) const {
-        for (std::size_t row = 0; row < count; ++row) {
+        for (std::size_t row = 0; row < count; ++row)
             w.seen += std::to_string(numbers[row]) + (std::strlen(texts[row]) == numbers[row] * 6u ? "," : " wrong,");
-        }
     }
 };
 

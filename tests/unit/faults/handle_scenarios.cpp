@@ -116,8 +116,7 @@ void AttachAndBegin(World& w) {
         {svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER},
         {session, OCI_HTYPE_SESSION, const_cast<char16_t*>(u"a name of eighteen"), 36, OCI_ATTR_USERNAME},
         {session, OCI_HTYPE_SESSION, const_cast<char16_t*>(u"password of eightn"), 36, OCI_ATTR_PASSWORD},
-        {svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION},
-    };
+        {svc, OCI_HTYPE_SVCCTX, session, 0, OCI_ATTR_SESSION}};
     for (const auto& s : set) w.STEP(OCIAttrSet, s.on, s.type, s.value, s.size, s.attribute, w.err);
     w.STEP(OCISessionBegin, svc, w.err, session, OCI_CRED_EXT, OCI_DEFAULT);
     w.AtEnd([&w, svc, session] { return OCISessionEnd(svc, w.err, session, OCI_DEFAULT); });

@@ -39,9 +39,8 @@ void FindRegions(World&) {
     if (!regions.empty()) return;
     const std::filesystem::path all("/usr/share/zoneinfo");
     for (const char* part : {"Africa", "America", "Asia", "Europe"}) {
-        for (const auto& entry : std::filesystem::directory_iterator(all / part)) {
+        for (const auto& entry : std::filesystem::directory_iterator(all / part))
             if (entry.is_regular_file()) regions.push_back(std::string(part) + '/' + entry.path().filename().string());
-        }
     }
     EXPECT_GT(regions.size(), 200u);
 }

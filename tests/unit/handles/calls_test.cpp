@@ -18,32 +18,27 @@ protected:
 };
 
 TEST_F(CallsTest, EveryTypeIsMadeAndFreedOnce) {
-    for (ub4 type = 0; type < 100; ++type) {
-        dvoid* made = &type;
-        const bool handle = type >= 1 && type <= 29;
-        const sword rc = OCIHandleAlloc(env_, &made, type, 0, nullptr);
-        EXPECT_EQ(rc, handle ? OCI_SUCCESS : OCI_ERROR) << type;
-        if (!handle) {
-            EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24316) << type;
-            EXPECT_EQ(made, &type) << "the output is written on success only";
-            continue;
+    const struct {
+        sword (*alloc)(const dvoid*, dvoid**, ub4, size_t, dvoid**);
+        sword (*free)(dvoid*, ub4);
+        sword (*other_free)(dvoid*, ub4);
+        ub4 first, last;
+        sb4 refused;
+    } kinds[] = {{OCIHandleAlloc, OCIHandleFree, OCIDescriptorFree, 1, 29, 24316},
+                 {OCIDescriptorAlloc, OCIDescriptorFree, OCIHandleFree, 50, 81, 24332}};
+    for (const auto& kind : kinds) {
+        for (ub4 type = 0; type < 100; ++type) {
+            dvoid* made = &type;
+            const bool known = type >= kind.first && type <= kind.last;
+            ASSERT_EQ(kind.alloc(env_, &made, type, 0, nullptr), known ? OCI_SUCCESS : OCI_ERROR) << type;
+            EXPECT_EQ(made == &type, !known) << "the output is written on success only";
+            EXPECT_TRUE(known || FirstCode(env_, OCI_HTYPE_ENV) == kind.refused) << type;
+            if (!known) continue;
+            EXPECT_EQ(kind.free(made, type == kind.last ? kind.first : type + 1), OCI_INVALID_HANDLE) << "another " << type;
+            EXPECT_EQ(kind.other_free(made, type), OCI_INVALID_HANDLE) << type;
+            EXPECT_EQ(kind.free(made, type), OCI_SUCCESS) << type;
+            EXPECT_EQ(kind.free(made, type), OCI_INVALID_HANDLE) << "freed twice " << type;
         }
-        EXPECT_EQ(OCIHandleFree(made, type == 29 ? 1 : type + 1), OCI_INVALID_HANDLE) << "another type " << type;
-        EXPECT_EQ(OCIDescriptorFree(made, type), OCI_INVALID_HANDLE) << type;
-        EXPECT_EQ(OCIHandleFree(made, type), OCI_SUCCESS) << type;
-        EXPECT_EQ(OCIHandleFree(made, type), OCI_INVALID_HANDLE) << "freed twice " << type;
-    }
-    for (ub4 type = 0; type < 100; ++type) {
-        dvoid* made = nullptr;
-        const bool descriptor = type >= 50 && type <= 81;
-        ASSERT_EQ(OCIDescriptorAlloc(env_, &made, type, 0, nullptr), descriptor ? OCI_SUCCESS : OCI_ERROR) << type;
-        if (!descriptor) {
-            EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24332) << type;
-            continue;
-        }
-        EXPECT_EQ(OCIHandleFree(made, type), OCI_INVALID_HANDLE) << type;
-        EXPECT_EQ(OCIDescriptorFree(made, type), OCI_SUCCESS) << type;
-        EXPECT_EQ(OCIDescriptorFree(made, type), OCI_INVALID_HANDLE) << type;
     }
 }
 
@@ -283,9 +278,8 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
         ub4 mode;
         sb4 number;
     } modes[] = {{OCI_LOGON2_CPOOL, 24392}, {OCI_LOGON2_SPOOL, 24416}, {0x800, 24300}};
-    for (const auto& c : modes) {
+    for (const auto& c : modes)
         EXPECT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, nullptr, 0, c.mode)), c.number) << c.mode;
-    }
     EXPECT_EQ(
         Answer(OCILogon2(env_, err_, &svc, Text("ann"), 3, Text("secret"), 6, Text("test"), 4, OCI_LOGON2_STMTCACHE)),
         0);

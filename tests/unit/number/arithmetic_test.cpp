@@ -33,8 +33,7 @@ TEST(NumberArithmetic, FourOperationsRoundTheExactResultOnce) {
         void (*exact)(mpq_ptr, mpq_srcptr, mpq_srcptr);
     } operations[] = {
         {"add", number::Add, mpq_add}, {"sub", number::Sub, mpq_sub}, {"mul", number::Mul, mpq_mul},
-        {"div", number::Div, mpq_div},
-    };
+        {"div", number::Div, mpq_div}};
     RandomNumbers numbers(1);
     for (int i = 0; i < 4000; ++i) {
         const int spread = i % 4 == 0 ? 62 : i % 4 == 1 ? 0 : 12;
@@ -145,8 +144,7 @@ TEST(NumberArithmetic, UnaryFunctionsAtTheirEdges) {
         {number::Floor, "9.99", "9"}, {number::Ceil, "1E100", "1E100"}, {number::Inc, "99", "100"},
         {number::Dec, "0", "-1"}, {number::Dec, "100", "99"}, {number::Inc, "1E42", "1"}, {number::Dec, "1E125", "-1"},
         {number::Abs, "-5", "5"}, {number::Neg, "0", "0"},
-        {number::Inc, "9999999999999999999999999999999999999999", "1E40"},
-    };
+        {number::Inc, "9999999999999999999999999999999999999999", "1E40"}};
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(c.function(Number(c.value), &got), 0) << c.value;
@@ -178,10 +176,9 @@ TEST(NumberArithmetic, PrecisionCountsFromTheFirstDigit) {
 TEST(NumberArithmetic, RangeAndDomainErrors) {
     const struct { number::Binary function; const char* left; const char* right; number::Errno error; } cases[] = {
         {number::Add, "9.9E125", "9.9E125", 22053}, {number::Mul, "1E100", "1E26", 22053},
-        {number::Mul, "1E-100", "1E-31", 22054},    {number::Sub, "1.01E-130", "1E-130", 22054},
-        {number::Div, "1", "0", 22056},             {number::Div, "0", "0", 22056},
-        {number::Mod, "5", "0", 22056},             {number::Div, "1E-100", "1E31", 22054},
-    };
+        {number::Mul, "1E-100", "1E-31", 22054}, {number::Sub, "1.01E-130", "1E-130", 22054},
+        {number::Div, "1", "0", 22056}, {number::Div, "0", "0", 22056}, {number::Mod, "5", "0", 22056},
+        {number::Div, "1E-100", "1E31", 22054}};
     for (const auto& c : cases) {
         OCINumber got;
         EXPECT_EQ(c.function(Number(c.left), Number(c.right), &got), c.error) << c.left << " " << c.right;
@@ -209,8 +206,7 @@ TEST(NumberArithmetic, BytesOfKnownValues) {
     const struct { const char* value; OCINumber bytes; } cases[] = {
         {"0", {{1, 0x80}}}, {"1", {{2, 0xC1, 2}}}, {"100", {{2, 0xC2, 2}}}, {"0.01", {{2, 0xC0, 2}}},
         {"-1", {{3, 0x3E, 0x64, 0x66}}}, {"-5", {{3, 0x3E, 0x60, 0x66}}}, {"123.45", {{4, 0xC2, 2, 0x18, 0x2E}}},
-        {"-123.45", {{5, 0x3D, 0x64, 0x4E, 0x38, 0x66}}}, {"1E-130", {{2, 0x80, 2}}},
-    };
+        {"-123.45", {{5, 0x3D, 0x64, 0x4E, 0x38, 0x66}}}, {"1E-130", {{2, 0x80, 2}}}};
     for (const auto& c : cases) EXPECT_EQ(Number(c.value), c.bytes) << c.value;
     OCINumber pi;
     number::SetPi(&pi);
@@ -221,8 +217,7 @@ TEST(NumberArithmetic, BytesOfKnownValues) {
 TEST(NumberArithmetic, UnusualBytesOfTheSameValue) {
     const struct { OCINumber bytes; const char* value; } cases[] = {
         {{{2, 193, 6, 255, 0, 102, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7}}, "5"}, {{{3, 194, 1, 6}}, "5"},
-        {{{2, 62, 96}}, "-5"}, {{{3, 193, 6, 1}}, "5"}, {{{2, 193, 1}}, "0"},
-    };
+        {{{2, 62, 96}}, "-5"}, {{{3, 193, 6, 1}}, "5"}, {{{2, 193, 1}}, "0"}};
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::Add(c.bytes, Number("1"), &got), 0) << c.value;

@@ -27,17 +27,14 @@ Converted Convert(unsigned source, unsigned target, const std::string& input, st
 
 TEST(CodePages, KnownBytesBothWays) {
     const struct { unsigned page; std::string bytes; std::string utf8; } cases[] = {
-        {37, "\xC1\xF1\x51\xBA", "A1é["},   {437, "\x82\xE1", "éß"},          {500, "\xC1\xF1\x51\x4A", "A1é["},
-        {819, "\xE9\xFF", "éÿ"},            {850, "\x82\xD5", "éı"},          {858, "\x82\xD5", "é€"},
-        {912, "\xB3", "ł"},                 {923, "\xA4\xBD", "€œ"},          {932, "\x82\xA0", "あ"},
-        {943, "\x82\xA0\xB1", "あｱ"},       {950, "\xA4\xA4", "中"},          {1200, "\x00\xE9\x4E\x2D"s, "é中"},
-        {1202, "\xE9\x00\x2D\x4E"s, "é中"}, {1208, "é中", "é中"},             {1250, "\xB3", "ł"},
-        {1251, "\xC6", "Ж"},                {1252, "\x80\xE9", "€é"},         {1253, "\xE1", "α"},
-        {1254, "\xF0", "ğ"},                {1255, "\xE0", "א"},              {1256, "\xC7", "ا"},
-        {1257, "\xE0", "ą"},                {1258, "e\xD2" "e", "ẻe"},    {1381, "\xD6\xD0", "中"},
-        {1383, "\xD6\xD0", "中"},           {5348, "\x80", "€"},              {13488, "\x00\xE9\x4E\x2D"s, "é中"},
-        {54936, "\xD6\xD0\x94\x32\xBE\x34", "中𝄞"}, {1202, "\x34\xD8\x1E\xDD", "𝄞"}, {1200, "\xD8\x34\xDD\x1E", "𝄞"},
-    };
+        {37, "\xC1\xF1\x51\xBA", "A1é["}, {437, "\x82\xE1", "éß"}, {500, "\xC1\xF1\x51\x4A", "A1é["},
+        {819, "\xE9\xFF", "éÿ"}, {850, "\x82\xD5", "éı"}, {858, "\x82\xD5", "é€"}, {912, "\xB3", "ł"},
+        {923, "\xA4\xBD", "€œ"}, {932, "\x82\xA0", "あ"}, {943, "\x82\xA0\xB1", "あｱ"}, {950, "\xA4\xA4", "中"},
+        {1200, "\x00\xE9\x4E\x2D"s, "é中"}, {1202, "\xE9\x00\x2D\x4E"s, "é中"}, {1208, "é中", "é中"}, {1250, "\xB3", "ł"},
+        {1251, "\xC6", "Ж"}, {1252, "\x80\xE9", "€é"}, {1253, "\xE1", "α"}, {1254, "\xF0", "ğ"}, {1255, "\xE0", "א"},
+        {1256, "\xC7", "ا"}, {1257, "\xE0", "ą"}, {1258, "e\xD2" "e", "ẻe"}, {1381, "\xD6\xD0", "中"},
+        {1383, "\xD6\xD0", "中"}, {5348, "\x80", "€"}, {13488, "\x00\xE9\x4E\x2D"s, "é中"},
+        {54936, "\xD6\xD0\x94\x32\xBE\x34", "中𝄞"}, {1202, "\x34\xD8\x1E\xDD", "𝄞"}, {1200, "\xD8\x34\xDD\x1E", "𝄞"}};
     for (const auto& c : cases) {
         const Converted there = Convert(c.page, 1208, c.bytes);
         const Converted back = Convert(1208, c.page, c.utf8);
@@ -83,8 +80,7 @@ TEST(CodePages, WhatCannotBeConverted) {
         {1208, 1202, "\xF4\x90\x80\x80", "\xFD\xFF\xFD\xFF\xFD\xFF\xFD\xFF"},
         {1208, 1202, "é\xE4\xB8", "\xE9\0\xFD\xFF\xFD\xFF"s}, {1202, 1208, "\x34\xD8" "a\0"s, "\uFFFD" "a"},
         {1202, 1208, "\x1E\xDD", "\uFFFD"}, {1202, 1208, "a\0b"s, "a\uFFFD"}, {1202, 819, "a\0b"s, "a?"},
-        {1200, 1208, "\xD8\x34", "\uFFFD"}, {1208, 13488, "𝄞", "\xFF\xFD"}, {943, 1208, "a\x82", "a\uFFFD"},
-    };
+        {1200, 1208, "\xD8\x34", "\uFFFD"}, {1208, 13488, "𝄞", "\xFF\xFD"}, {943, 1208, "a\x82", "a\uFFFD"}};
     for (const auto& c : cases) {
         const Converted converted = Convert(c.source, c.target, c.input);
         EXPECT_EQ(converted.result, kCodePageSubstituted) << c.source << " to " << c.target;
@@ -129,13 +125,11 @@ TEST(CodePages, UnknownPagesAndNullAreasAreRefused) {
 
 TEST(CodePages, OfTheProcess) {
     const struct { const char* locale; const char* setting; int result; unsigned first; unsigned second; } cases[] = {
-        {"C", nullptr, 0, 1208, 1208},         {"C.UTF-8", nullptr, 0, 1208, 1208},
-        {"not-a-locale", "", 0, 1208, 1208},   {"C", "850", 0, 850, 850},
-        {"C", "1208,1252", 0, 1208, 1252},     {"C", "13488,1208", 0, 13488, 1208},
-        {"C", "0", kCodePageUnknown, 1208, 1208},         {"C", "1208,1", kCodePageUnknown, 1208, 1208},
+        {"C", nullptr, 0, 1208, 1208}, {"C.UTF-8", nullptr, 0, 1208, 1208}, {"not-a-locale", "", 0, 1208, 1208},
+        {"C", "850", 0, 850, 850}, {"C", "1208,1252", 0, 1208, 1252}, {"C", "13488,1208", 0, 13488, 1208},
+        {"C", "0", kCodePageUnknown, 1208, 1208}, {"C", "1208,1", kCodePageUnknown, 1208, 1208},
         {"C", "1208,", kCodePageBadArgument, 1208, 1208}, {"C", "latin", kCodePageBadArgument, 1208, 1208},
-        {"C", "850 ", kCodePageBadArgument, 1208, 1208},  {"C", "99999999999", kCodePageBadArgument, 1208, 1208},
-    };
+        {"C", "850 ", kCodePageBadArgument, 1208, 1208}, {"C", "99999999999", kCodePageBadArgument, 1208, 1208}};
     for (const auto& c : cases) {
         setenv("LC_ALL", c.locale, 1);
         if (c.setting) setenv("KELPCI_CODEPAGE", c.setting, 1);

@@ -54,8 +54,7 @@ TEST_F(Ini, ReadsAsWritten) {
     const struct { const char* section; const char* key; const char* value; } cases[] = {
         {"kelpci", "trace", "on ; really"}, {"KELPCI", "TRACE", "on ; really"}, {"other", "trace", "other"},
         {"kelpci", "empty", ""}, {"kelpci", "last", "=x="}, {"kelpci", "; c", "none"}, {"kelpci", "d", "none"},
-        {"kelpci", "not a setting", "none"}, {"nowhere", "trace", "none"}, {"kelpci", "", "none"},
-    };
+        {"kelpci", "not a setting", "none"}, {"nowhere", "trace", "none"}, {"kelpci", "", "none"}};
     for (const auto& c : cases) EXPECT_EQ(Read(c.section, c.key), c.value) << c.section << ", " << c.key;
     EXPECT_EQ(Read("kelpci", nullptr), "Trace\0empty\0last\0"s);
     EXPECT_EQ(Read("nowhere", nullptr), "");
@@ -76,13 +75,12 @@ TEST_F(Ini, AWriteChangesOneLine) {
         {"", "s", "k", "v", "[s]\nk=v\n"},
         {"; top\n[s]\nK  =  old\n; end\n", "S", "k", "new", "; top\n[s]\nK  =  new\n; end\n"},
         {"[s]\r\na=1\r\n\r\n[t]\r\nb=2", "s", "k", "v", "[s]\r\na=1\r\nk=v\r\n\r\n[t]\r\nb=2"},
-        {"[s]\r\na=1\n", "s", "k", "v", "[s]\r\na=1\nk=v\r\n"},
-        {"[s]\r\na=1", "s", "k", "v", "[s]\r\na=1\r\nk=v\r\n"}, {"[s]\na=1\n", "t", "k", "v", "[s]\na=1\n\n[t]\nk=v\n"},
-        {"[s]\n\n", "s", "k", "v", "[s]\nk=v\n\n"}, {"[s]\nk=1\nk=2\n", "s", "k", "3", "[s]\nk=3\nk=2\n"},
+        {"[s]\r\na=1\n", "s", "k", "v", "[s]\r\na=1\nk=v\r\n"}, {"[s]\r\na=1", "s", "k", "v", "[s]\r\na=1\r\nk=v\r\n"},
+        {"[s]\na=1\n", "t", "k", "v", "[s]\na=1\n\n[t]\nk=v\n"}, {"[s]\n\n", "s", "k", "v", "[s]\nk=v\n\n"},
+        {"[s]\nk=1\nk=2\n", "s", "k", "3", "[s]\nk=3\nk=2\n"},
         {"[s]\nk=1\nodd line\nk=2\n[t]\nk=3\n", "s", "K", nullptr, "[s]\nodd line\n[t]\nk=3\n"},
         {"[s]\nk=1\n", "s", "absent", nullptr, "[s]\nk=1\n"}, {"[s]\nk=\n", "s", "k", "v", "[s]\nk=v\n"},
-        {"[s]\nk=1\n", "s", "k", "", "[s]\nk=\n"}, {"k=0\n[s]\n", "", "k", "1", "k=1\n[s]\n"},
-    };
+        {"[s]\nk=1\n", "s", "k", "", "[s]\nk=\n"}, {"k=0\n[s]\n", "", "k", "1", "k=1\n[s]\n"}};
     for (const auto& c : cases) {
         Put(c.before);
         EXPECT_TRUE(Write(c.section, c.key, c.value));
@@ -93,9 +91,8 @@ TEST_F(Ini, AWriteChangesOneLine) {
 TEST_F(Ini, RefusesWhatCouldNotBeReadBack) {
     Put("[s]\nk=1\n");
     const struct { const char* section; const char* key; const char* value; } cases[] = {
-        {"s", "", "v"},     {"s", nullptr, "v"}, {"s", "a=b", "v"},     {"s", "[a", "v"},   {"s", ";a", "v"},
-        {"s", " a", "v"},   {"s", "a", "v\nb=1"}, {"s", "a\nb", "v"},   {"s]", "a", "v"},   {"s", "#", nullptr},
-    };
+        {"s", "", "v"}, {"s", nullptr, "v"}, {"s", "a=b", "v"}, {"s", "[a", "v"}, {"s", ";a", "v"}, {"s", " a", "v"},
+        {"s", "a", "v\nb=1"}, {"s", "a\nb", "v"}, {"s]", "a", "v"}, {"s", "#", nullptr}};
     for (const auto& c : cases) EXPECT_FALSE(Write(c.section, c.key, c.value)) << (c.key ? c.key : "null");
     EXPECT_EQ(Content(), "[s]\nk=1\n");
 }

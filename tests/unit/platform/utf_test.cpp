@@ -17,8 +17,7 @@ TEST(Utf, BothWays) {
     const struct { std::string utf8; std::u16string utf16; } cases[] = {
         {"", u""}, {"a", u"a"}, {"\xC3\xA4", u"\u00E4"}, {"\xE2\x82\xAC", u"\u20AC"},
         {"\xF0\x9F\x98\x80", u"\U0001F600"}, {"\xEF\xBF\xBF", u"\uFFFF"}, {"a\0b"s, u"a\0b"s},
-        {"sixteen letters!", u"sixteen letters!"}, {"seventeen lettersx\x7F", u"seventeen lettersx\x7F"},
-    };
+        {"sixteen letters!", u"sixteen letters!"}, {"seventeen lettersx\x7F", u"seventeen lettersx\x7F"}};
     for (const auto& c : cases) {
         std::string out = "<";
         EXPECT_TRUE(utf::ToUtf16(c.utf8, out)) << c.utf8;

@@ -28,8 +28,7 @@ TEST(PackedDecimal, ToText) {
         {"\x00\x00\x5B"s, 5, 2, "-0.05", 0}, {"\x01\x2F", 2, 2, "0.12", 0}, {"\x01\x2A", 2, 4, "0.0012", 0},
         {"\x12\x3E", 3, 3, "0.123", 0}, {"\x12\x3C", 3, -2, "12300", 0}, {"\x00\x0C"s, 3, -2, "0", 0},
         {"\x7C", 1, 0, "7", 0}, {"\xC", 0, 0, "0", 0}, {"\x12\x34\x59", 5, 2, "", kDecimalBadSign},
-        {"\x1A\x34\x5C", 5, 2, "1", kDecimalBadDigit}, {"\x12\x34\xBC", 5, 2, "123.4", kDecimalBadDigit},
-    };
+        {"\x1A\x34\x5C", 5, 2, "1", kDecimalBadDigit}, {"\x12\x34\xBC", 5, 2, "123.4", kDecimalBadDigit}};
     for (const auto& c : cases) {
         char text[64] = "?";
         const auto* packed = reinterpret_cast<const unsigned char*>(c.packed.data());
@@ -52,13 +51,12 @@ TEST(PackedDecimal, ToTextOfEveryCapacity) {
 
 TEST(PackedDecimal, FromText) {
     const struct { const char* text; unsigned precision; int scale; std::string packed; } cases[] = {
-        {"-123.45", 5, 2, "\x12\x34\x5D"}, {" +1.5 ", 5, 2, "\x00\x15\x0C"s},  {"0.0", 5, 2, "\x00\x00\x0C"s},
-        {"-0", 5, 2, "\x00\x00\x0C"s},     {"1.005", 3, 2, "\x10\x1C"},        {"-1.0049", 3, 2, "\x10\x0D"},
-        {"9.995", 4, 2, "\x01\x00\x0C"s},  {".5", 1, 0, "\x1C"},               {"0.04", 1, 1, "\x0C"},
-        {"-0.04", 1, 1, "\x0C"},           {"0.004", 1, 1, "\x0C"},            {"12e2", 4, 0, "\x01\x20\x0C"s},
-        {"1234e-2", 4, 2, "\x01\x23\x4C"}, {"1e-999999999999", 3, 2, "\x00\x0C"s}, {"12345", 3, -2, "\x12\x3C"},
-        {"000000123", 3, 0, "\x12\x3C"},   {"0e999999", 3, 0, "\x00\x0C"s},
-    };
+        {"-123.45", 5, 2, "\x12\x34\x5D"}, {" +1.5 ", 5, 2, "\x00\x15\x0C"s}, {"0.0", 5, 2, "\x00\x00\x0C"s},
+        {"-0", 5, 2, "\x00\x00\x0C"s}, {"1.005", 3, 2, "\x10\x1C"}, {"-1.0049", 3, 2, "\x10\x0D"},
+        {"9.995", 4, 2, "\x01\x00\x0C"s}, {".5", 1, 0, "\x1C"}, {"0.04", 1, 1, "\x0C"}, {"-0.04", 1, 1, "\x0C"},
+        {"0.004", 1, 1, "\x0C"}, {"12e2", 4, 0, "\x01\x20\x0C"s}, {"1234e-2", 4, 2, "\x01\x23\x4C"},
+        {"1e-999999999999", 3, 2, "\x00\x0C"s}, {"12345", 3, -2, "\x12\x3C"}, {"000000123", 3, 0, "\x12\x3C"},
+        {"0e999999", 3, 0, "\x00\x0C"s}};
     for (const auto& c : cases) {
         std::string packed(PackedDecimalSize(c.precision), '?');
         auto* area = reinterpret_cast<unsigned char*>(packed.data());
@@ -67,10 +65,9 @@ TEST(PackedDecimal, FromText) {
     }
     const struct { const char* text; unsigned precision; int scale; int result; } refused[] = {
         {"1000", 5, 2, kDecimalOverflow}, {"999.995", 5, 2, kDecimalOverflow}, {"1e9999999999", 5, 2, kDecimalOverflow},
-        {"", 5, 2, kDecimalBadText},      {".", 5, 2, kDecimalBadText},        {"1.2.3", 5, 2, kDecimalBadText},
-        {"12x", 5, 2, kDecimalBadText},   {"1e", 5, 2, kDecimalBadText},       {"--1", 5, 2, kDecimalBadText},
-        {nullptr, 5, 2, kDecimalBadText},
-    };
+        {"", 5, 2, kDecimalBadText}, {".", 5, 2, kDecimalBadText}, {"1.2.3", 5, 2, kDecimalBadText},
+        {"12x", 5, 2, kDecimalBadText}, {"1e", 5, 2, kDecimalBadText}, {"--1", 5, 2, kDecimalBadText},
+        {nullptr, 5, 2, kDecimalBadText}};
     for (const auto& c : refused) {
         unsigned char packed[3] = {1, 2, 3};
         EXPECT_EQ(TextToDecimal(c.text, packed, c.precision, c.scale), c.result) << (c.text ? c.text : "null");
@@ -83,8 +80,7 @@ TEST(Numbers, RulesOfAtoiAndBeyondTheRange) {
         {"42", 42, 42}, {" \t-7x", -7, 0xFFFFFFFFFFFFFFF9}, {"+3", 3, 3}, {"x", 0, 0}, {"", 0, 0}, {nullptr, 0, 0},
         {"0x10", 0, 0}, {"010", 10, 10}, {"2147483648", 2147483648, 2147483648},
         {"-2147483649", -2147483649, 0xFFFFFFFF7FFFFFFF}, {"18446744073709551615", INT64_MAX, UINT64_MAX},
-        {"99999999999999999999", INT64_MAX, UINT64_MAX}, {"-99999999999999999999", INT64_MIN, UINT64_MAX},
-    };
+        {"99999999999999999999", INT64_MAX, UINT64_MAX}, {"-99999999999999999999", INT64_MIN, UINT64_MAX}};
     for (const auto& c : cases) {
         EXPECT_EQ(StrToInt64(c.text), c.i) << (c.text ? c.text : "null");
         EXPECT_EQ(StrToUint64(c.text), c.u) << (c.text ? c.text : "null");
@@ -151,8 +147,7 @@ TEST(MessageTexts, OfDiagnosticsInLines) {
 TEST(MessageTexts, OfSqlstates) {
     const struct { const char* code; const char* text; } cases[] = {
         {"40001", "40001: transaction rollback: serialization failure"}, {"40003", "40003: transaction rollback"},
-        {"28000xyz", "28000: invalid authorization"}, {"00000", ""}, {"28", ""}, {"ZZ000", ""}, {"", ""},
-    };
+        {"28000xyz", "28000: invalid authorization"}, {"00000", ""}, {"28", ""}, {"ZZ000", ""}, {"", ""}};
     for (const auto& c : cases) {
         char area[100];
         const std::size_t length = SqlstateMessageText(area, sizeof area, 80, "kelpsql.mo", c.code);
@@ -197,14 +192,12 @@ TEST(DecimalFloat, FromText) {
         std::size_t size;
         const char* hex;  // least significant byte first
     } cases[] = {
-        {"0", 8, "000000000000C031"},                  {"0E500", 8, "000000000000C031"},
-        {"-0.00", 8, "000000000000C0B1"},              {"1", 8, "010000000000C031"},
-        {"-1", 8, "010000000000C0B1"},                 {"12.5", 8, "7D0000000000A031"},
-        {"9999999999999999", 8, "FFFFC06FF286736C"},   {"99999999999999995", 8, "0080C6A47E8D0332"},
-        {"1E384", 8, "0080C6A47E8DE35F"},              {"1E-398", 8, "0100000000000000"},
-        {"4E-399", 8, "0000000000000000"},             {"5E-399", 8, "0100000000000000"},
-        {"1", 16, "01000000000000000000000000004030"}, {"-0.1", 16, "01000000000000000000000000003EB0"},
-    };
+        {"0", 8, "000000000000C031"}, {"0E500", 8, "000000000000C031"}, {"-0.00", 8, "000000000000C0B1"},
+        {"1", 8, "010000000000C031"}, {"-1", 8, "010000000000C0B1"}, {"12.5", 8, "7D0000000000A031"},
+        {"9999999999999999", 8, "FFFFC06FF286736C"}, {"99999999999999995", 8, "0080C6A47E8D0332"},
+        {"1E384", 8, "0080C6A47E8DE35F"}, {"1E-398", 8, "0100000000000000"}, {"4E-399", 8, "0000000000000000"},
+        {"5E-399", 8, "0100000000000000"}, {"1", 16, "01000000000000000000000000004030"},
+        {"-0.1", 16, "01000000000000000000000000003EB0"}};
     for (const auto& c : cases) {
         unsigned char bytes[16];
         ASSERT_TRUE(decimal_float::FromText(c.text, c.size, bytes)) << c.text;
@@ -226,8 +219,7 @@ TEST(DecimalFloat, PartsOfTheBytes) {
         unsigned long long coefficient;
     } cases[] = {
         {"-12.5", 8, true, -1, 125}, {"9999999999999999E369", 8, false, 369, 9999999999999999},
-        {"1E-398", 8, false, -398, 1}, {"-12.5", 16, true, -1, 125}, {"7E-6176", 16, false, -6176, 7},
-    };
+        {"1E-398", 8, false, -398, 1}, {"-12.5", 16, true, -1, 125}, {"7E-6176", 16, false, -6176, 7}};
     for (const auto& c : cases) {
         unsigned char bytes[16];
         ASSERT_TRUE(decimal_float::FromText(c.text, c.size, bytes)) << c.text;
@@ -257,8 +249,7 @@ TEST(PackedDecimal, DigitsOfTheBytes) {
         {"\x12\x34\x5E", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5F", 5, kDecimalDone, false, "12345"},
         {"\x00\x00\x7C"s, 1, kDecimalDone, false, "7"}, {"\x00\x0D"s, 1, kDecimalDone, true, ""},
         {"\x12\x34\x5C", 4, kDecimalTooShort, false, "1234"}, {"\x12\x34\x59", 5, kDecimalBadSign, false, ""},
-        {"\x1A\x34\x5C", 5, kDecimalBadDigit, false, "1"},
-    };
+        {"\x1A\x34\x5C", 5, kDecimalBadDigit, false, "1"}};
     for (const auto& c : cases) {
         char digits[16] = {};
         bool negative = false;

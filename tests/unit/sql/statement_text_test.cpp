@@ -118,8 +118,7 @@ TEST(SqlText, Blocks) {
         {"BEGIN OPEN :c FOR select ';' from t; OPEN :d FOR values(:v); END", "select ';' from t | values(?1)"},
         {"begin insert into t values(:a, :a); commit; end name;", "insert into t values(?1, ?2) | commit"},
         {"begin :x := :y * 2; null; end;", "select ?1 * 2 | "},
-        {"begin select a, b into :x, :y from t where c = :z; end;", "select a, b  from t where c = ?1"},
-    };
+        {"begin select a, b into :x, :y from t where c = :z; end;", "select a, b  from t where c = ?1"}};
     for (const auto& c : cases) {
         const sql::StatementText statement = sql::Scan(c.text);
         EXPECT_EQ(statement.error, 0) << c.text;

@@ -186,8 +186,7 @@ TEST_F(Executing, Transactions) {
         {{"insert into t values(1)", "savepoint s", "insert into t values(2)", "rollback to s", "commit work"}, 0, "1"},
         {{"insert into t values(3)", "create table u(a number)"}, 0, "1"},
         {{"insert into t values(1)", "create tabel u(a number)"}, 900, "0"},
-        {{"insert into t values(1)", "insert into t values(1)", "create unique index i on t(a)"}, 1, "2"},
-    };
+        {{"insert into t values(1)", "insert into t values(1)", "create unique index i on t(a)"}, 1, "2"}};
     for (const auto& c : cases) {
         MustRun("delete from t", "commit");
         for (const char* sql : c.texts) EXPECT_EQ(Run(sql), sql == c.texts.back() ? c.last : 0) << sql;

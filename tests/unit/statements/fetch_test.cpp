@@ -76,8 +76,7 @@ TEST_F(Fetching, NullsAndTruncation) {
         {false, true, false, OCI_SUCCESS, 0, -1, 9}, {false, true, true, OCI_SUCCESS, 0, -1, 1405},
         {true, false, false, OCI_ERROR, 1406, 9, 9}, {true, true, false, OCI_ERROR, 1406, 5, 9},
         {true, false, true, OCI_SUCCESS_WITH_INFO, 24345, 9, 1406},
-        {true, true, true, OCI_SUCCESS_WITH_INFO, 24345, 5, 1406},
-    };
+        {true, true, true, OCI_SUCCESS_WITH_INFO, 24345, 5, 1406}};
     for (const auto& c : cases) {
         const std::string shown = std::string(c.truncated ? "truncated" : "null") + (c.indicators ? " indicator" : "") +
                                   (c.codes ? " code" : "");
@@ -156,15 +155,13 @@ TEST_F(Fetching, ExactFetch) {
 TEST_F(Fetching, Scrolling) {
     Open(OCI_STMT_SCROLLABLE_READONLY);
     const struct { ub4 rows; ub2 orientation; sb4 offset; sb4 answer; const char* delivered; ub4 position; } cases[] = {
-        {2, OCI_FETCH_NEXT, 0, 0, "1,2", 2}, {1, OCI_FETCH_CURRENT, 0, 0, "2", 2},
-        {1, OCI_FETCH_LAST, 99, 0, "7", 7}, {1, OCI_FETCH_NEXT, 0, 1403, "", 8},
-        {1, OCI_FETCH_PRIOR, 0, 0, "7", 7}, {2, OCI_FETCH_ABSOLUTE, 3, 0, "3,4", 4},
-        {2, OCI_FETCH_RELATIVE, -2, 0, "2,3", 3}, {1, OCI_FETCH_RELATIVE, -3, 1403, "", 0},
-        {1, OCI_DEFAULT, 0, 0, "1", 1}, {1, OCI_FETCH_PRIOR, 0, 1403, "", 0},
+        {2, OCI_FETCH_NEXT, 0, 0, "1,2", 2}, {1, OCI_FETCH_CURRENT, 0, 0, "2", 2}, {1, OCI_FETCH_LAST, 99, 0, "7", 7},
+        {1, OCI_FETCH_NEXT, 0, 1403, "", 8}, {1, OCI_FETCH_PRIOR, 0, 0, "7", 7},
+        {2, OCI_FETCH_ABSOLUTE, 3, 0, "3,4", 4}, {2, OCI_FETCH_RELATIVE, -2, 0, "2,3", 3},
+        {1, OCI_FETCH_RELATIVE, -3, 1403, "", 0}, {1, OCI_DEFAULT, 0, 0, "1", 1}, {1, OCI_FETCH_PRIOR, 0, 1403, "", 0},
         {3, OCI_FETCH_FIRST, 5, 0, "1,2,3", 3}, {4, OCI_FETCH_ABSOLUTE, 6, 1403, "6,7", 7},
         {1, OCI_FETCH_ABSOLUTE, 0, 1403, "", 0}, {1, OCI_FETCH_ABSOLUTE, -1, 24389, "", 0},
-        {1, OCI_FETCH_ABSOLUTE, 2000000000, 1403, "", 8}, {1, 0x80, 0, 24391, "", 8},
-    };
+        {1, OCI_FETCH_ABSOLUTE, 2000000000, 1403, "", 8}, {1, 0x80, 0, 24391, "", 8}};
     for (std::size_t index = 0; index < std::size(cases); ++index) {
         const auto& c = cases[index];
         EXPECT_EQ(Fetch(c.rows, c.orientation, c.offset), c.answer) << index;

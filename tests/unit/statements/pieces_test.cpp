@@ -46,8 +46,7 @@ TEST_F(PieceByPiece, OneCycleARow) {
     MustRun("create table t(id number, name varchar2(40))", "insert into t values(2, 'row 2'), (3, null)");
     ASSERT_EQ(Query("select id, name from t order by id", {}, 0), 0);
     OCIDefine* defines[2] = {};
-    for (ub4 column = 0; column < 2; ++column)
-        ASSERT_EQ(Define(&defines[column], column + 1, InPieces(SQLT_STR)), 0);
+    for (ub4 column = 0; column < 2; ++column) ASSERT_EQ(Define(&defines[column], column + 1, InPieces(SQLT_STR)), 0);
     const char* expected[2][2] = {{"2", "row 2"}, {"3", nullptr}};
     for (const auto& row : expected) {
         ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
@@ -301,8 +300,7 @@ TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
     const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {
         {"\xc3\xa4z", SQLT_CHR, 1, 2, "\xc3\xa4"}, {"\xe2\x82\xacz", SQLT_CHR, 2, 3, "\xe2\x82\xac"},
         {"a\xe2\x82\xacz", SQLT_CHR, 0, 3, "a"}, {"az", SQLT_STR, 0, 2, "a"}, {"az", SQLT_STR, 1, 2, "a"},
-        {"\xc3\xa4z", SQLT_STR, 2, 3, "\xc3\xa4"},
-    };
+        {"\xc3\xa4z", SQLT_STR, 2, 3, "\xc3\xa4"}};
     for (const auto& c : cases) {
         Begin("select '" + std::string(c.value) + "' from dual", {InPieces(c.type)});
         char buffer[8] = "";
@@ -443,8 +441,7 @@ TEST_F(Utf16Pieces, EndBetweenCharacters) {
     const struct { const char* value; ub2 type; ub4 room; std::u16string_view first; string_view closed; } cases[] = {
         {"'ab'", SQLT_STR, 4, u"a", string_view("\0\0", 2)}, {"'ab'", SQLT_STR, 5, u"a", string_view("\0\0", 2)},
         {"'ab'", SQLT_CHR, 3, u"a", "#"}, {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 4, u"a", "#"},
-        {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 6, u"a\U0001F600", "#"},
-    };
+        {"'a' || cast(x'F09F9880' as text) || 'b'", SQLT_CHR, 6, u"a\U0001F600", "#"}};
     for (const auto& c : cases) {
         Begin(std::string("select ") + c.value + " from dual", {InPieces(c.type)});
         std::string buffer(10, '#');

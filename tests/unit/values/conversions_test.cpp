@@ -86,11 +86,10 @@ TEST_F(Conversions, NumbersAsText) {
     const struct { const char* expression; const char* text; } cases[] = {
         {"0", "0"}, {"-12", "-12"}, {"9223372036854775807", "9223372036854775807"}, {"0.5", ".5"}, {"-0.25", "-.25"},
         {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"},
-        {"1e39", "1000000000000000000000000000000000000000"},
-        {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"}, {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf"},
-        {"-9e999", "-Inf"}, {"0.1 + 0.2", ".3"}, {"4.35 * 100", "435"}, {"1 / 3.0", ".333333333333333"},
-        {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"},
-    };
+        {"1e39", "1000000000000000000000000000000000000000"}, {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"},
+        {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf"}, {"-9e999", "-Inf"}, {"0.1 + 0.2", ".3"},
+        {"4.35 * 100", "435"}, {"1 / 3.0", ".333333333333333"},
+        {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"}};
     for (const auto& c : cases)
         EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.text) << c.expression;
 }
@@ -98,22 +97,19 @@ TEST_F(Conversions, NumbersAsText) {
 TEST_F(Conversions, Integers) {
     const struct { const char* expression; ub2 type; sb4 size; sb8 value; sb4 error; } cases[] = {
         {"-128", SQLT_INT, 1, -128, 0}, {"-129", SQLT_INT, 1, 0, 1455}, {"32767", SQLT_INT, 2, 32767, 0},
-        {"32768", SQLT_INT, 2, 0, 1455},
-        {"-2147483648", SQLT_INT, 4, -2147483648LL, 0}, {"2147483648", SQLT_INT, 4, 0, 1455},
-        {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0}, {"9.3e18", SQLT_INT, 8, 0, 1455},
-        {"-9.3e18", SQLT_INT, 8, 0, 1455},
+        {"32768", SQLT_INT, 2, 0, 1455}, {"-2147483648", SQLT_INT, 4, -2147483648LL, 0},
+        {"2147483648", SQLT_INT, 4, 0, 1455}, {"9223372036854775807", SQLT_INT, 8, INT64_MAX, 0},
+        {"9.3e18", SQLT_INT, 8, 0, 1455}, {"-9.3e18", SQLT_INT, 8, 0, 1455},
         {"9223372036854775807 + 1", SQLT_INT, 8, 0, 1455}, {"-9223372036854775807 - 1", SQLT_INT, 8, INT64_MIN, 0},
-        {"-9223372036854775808 - 2048", SQLT_INT, 8, 0, 1455},
-        {"18446744073709551616", SQLT_UIN, 8, 0, 1455}, {"18446744073709549568.0", SQLT_UIN, 8, -2048, 0},
-        {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0}, {"-2.99", SQLT_INT, 4, -2, 0},
-        {"' 17 '", SQLT_INT, 4, 17, 0}, {"4.35 * 100", SQLT_INT, 4, 435, 0}, {"9.95 * 100", SQLT_UIN, 2, 995, 0},
-        {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722}, {"''", SQLT_INT, 4, 0, 1722},
-        {"x'01'", SQLT_INT, 4, 0, 932},
-        {"255", SQLT_UIN, 1, 255, 0}, {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455},
-        {"-0.5", SQLT_UIN, 4, 0, 0}, {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
+        {"-9223372036854775808 - 2048", SQLT_INT, 8, 0, 1455}, {"18446744073709551616", SQLT_UIN, 8, 0, 1455},
+        {"18446744073709549568.0", SQLT_UIN, 8, -2048, 0}, {"9e999", SQLT_INT, 8, 0, 1455}, {"2.99", SQLT_INT, 4, 2, 0},
+        {"-2.99", SQLT_INT, 4, -2, 0}, {"' 17 '", SQLT_INT, 4, 17, 0}, {"4.35 * 100", SQLT_INT, 4, 435, 0},
+        {"9.95 * 100", SQLT_UIN, 2, 995, 0}, {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722},
+        {"''", SQLT_INT, 4, 0, 1722}, {"x'01'", SQLT_INT, 4, 0, 932}, {"255", SQLT_UIN, 1, 255, 0},
+        {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455}, {"-0.5", SQLT_UIN, 4, 0, 0},
+        {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
         {"cast('18446744073709551615' as number)", SQLT_UIN, 8, -1, 0},
-        {"cast('18446744073709551616' as number)", SQLT_UIN, 8, 0, 1455}, {"date '2024-01-01'", SQLT_INT, 4, 0, 1722},
-    };
+        {"cast('18446744073709551616' as number)", SQLT_UIN, 8, 0, 1455}, {"date '2024-01-01'", SQLT_INT, 4, 0, 1722}};
     for (const auto& c : cases) {
         const std::string shown = Shown(c.expression, c.type, c.size);
         const std::string area = Out(c.expression, c.type, c.size);
@@ -367,16 +363,13 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
 
 TEST_F(Conversions, SizesThatATypeCannotHave) {
     const struct { ub2 type; sb4 size; sb4 answer; } cases[] = {
-        {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483},
-        {SQLT_FLT, 2, 1483}, {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0},
-        {SQLT_DAT, 6, 1483},
+        {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483}, {SQLT_FLT, 2, 1483},
+        {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0}, {SQLT_DAT, 6, 1483},
         {SQLT_ODT, 7, 1483}, {SQLT_BFLOAT, 7, 1483}, {SQLT_BFLOAT, 5, 1483}, {SQLT_BFLOAT, 4, 0}, {SQLT_BDOUBLE, 8, 0},
-        {SQLT_BDOUBLE, 9, 1483}, {SQLT_NUM, 0, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483},
-        {SQLT_CHR, -1, 1459}, {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459},
-        {SQLT_LVC, 3, 1459},
+        {SQLT_BDOUBLE, 9, 1483}, {SQLT_NUM, 0, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483}, {SQLT_CHR, -1, 1459},
+        {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459}, {SQLT_LVC, 3, 1459},
         {SQLT_BIN, -5, 1459}, {SQLT_VBI, 1, 1459}, {SQLT_VST, 4, 1483}, {SQLT_VST, 0, 0}, {SQLT_RSET, -1, 0},
-        {SQLT_TIME, 7, 1483}, {0, 8, 3115}, {10, 8, 3115}, {SQLT_NTY, 8, 3115}, {9999, 8, 3115},
-    };
+        {SQLT_TIME, 7, 1483}, {0, 8, 3115}, {10, 8, 3115}, {SQLT_NTY, 8, 3115}, {9999, 8, 3115}};
     char area[200] = "";
     for (const auto& c : cases) {
         ASSERT_EQ(Prepare("select :1 from dual"), 0);
