@@ -43,32 +43,6 @@ protected:
     }
 };
 
-TEST_F(DateCalls, RefuseNullAndForeignPointers) {
-    const OCIDate day = Date(2024, 2, 29);
-    OCIDate out{};
-    sword order = 0;
-    sb4 days = 0;
-    uword flags = 0;
-    ub4 size = 10;
-    OraText text[10];
-    const sword codes[] = {
-        OCIDateAddDays(err_, nullptr, 1, &out), OCIDateAddDays(err_, &day, 1, nullptr),
-        OCIDateAddMonths(err_, nullptr, 1, &out), OCIDateAssign(err_, nullptr, &out),
-        OCIDateAssign(err_, &day, nullptr), OCIDateCheck(err_, nullptr, &flags), OCIDateCheck(err_, &day, nullptr),
-        OCIDateLastDay(err_, &day, nullptr),
-        OCIDateCompare(err_, nullptr, &day, &order), OCIDateCompare(err_, &day, nullptr, &order),
-        OCIDateCompare(err_, &day, &day, nullptr), OCIDateDaysBetween(err_, &day, nullptr, &days),
-        OCIDateNextDay(err_, &day, nullptr, 3, &out), OCIDateNextDay(err_, &day, Text("SUN"), 3, nullptr),
-        OCIDateSysDate(err_, nullptr), OCIDateToText(err_, nullptr, nullptr, 0, nullptr, 0, &size, text),
-        OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, nullptr, text),
-        OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, &size, nullptr),
-        OCIDateFromText(err_, nullptr, 5, nullptr, 0, nullptr, 0, &out)};
-    for (const sword code : codes) EXPECT_EQ(Answer(code), 21560) << &code - codes;
-    EXPECT_EQ(OCIDateAddDays(nullptr, &day, 1, &out), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIDateAddDays(Bogus<OCIError>(), &day, 1, &out), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIDateAddDays(reinterpret_cast<OCIError*>(env_), &day, 1, &out), OCI_INVALID_HANDLE);
-}
-
 TEST_F(DateCalls, ResultsAreWrittenOnSuccessOnly) {
     OCIDate day = Date(2024, 2, 29, 1, 2, 3);
     EXPECT_EQ(Answer(OCIDateAddMonths(err_, &day, 12, &day)), 0);    // the operand as the result
@@ -201,37 +175,6 @@ TEST_F(DateCalls, AZoneWithoutLengthIsThatOfTheSession) {
         EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, plain, other, &order)), 0);
         EXPECT_EQ(order, 0) << c.length;
     }
-}
-
-TEST_F(DateCalls, DatetimesRefuseNullAndForeignPointers) {
-    OCIDateTime* value = NewDateTime(OCI_DTYPE_TIMESTAMP);
-    ASSERT_EQ(Answer(Construct(value)), 0);
-    sb2 year;
-    ub1 part;
-    ub4 wide;
-    sword order;
-    const sword nulls[] = {
-        OCIDateTimeAssign(env_, err_, nullptr, value), OCIDateTimeAssign(env_, err_, value, nullptr),
-        OCIDateTimeCheck(env_, err_, value, nullptr), OCIDateTimeCheck(env_, err_, nullptr, &wide),
-        OCIDateTimeCompare(env_, err_, value, value, nullptr), OCIDateTimeCompare(env_, err_, value, nullptr, &order),
-        OCIDateTimeGetDate(env_, err_, value, nullptr, &part, &part),
-        OCIDateTimeGetDate(env_, err_, nullptr, &year, &part, &part),
-        OCIDateTimeGetTime(env_, err_, value, &part, &part, &part, nullptr), Construct(nullptr),
-        OCI_datetimeSetDate(env_, err_, nullptr, 1, 1, 1), OCI_datetimeSetTime(env_, err_, nullptr, 1, 1, 1, 1)};
-    for (const sword code : nulls) EXPECT_EQ(Answer(code), 21560) << &code - nulls;
-    auto* foreign = Bogus<OCIDateTime>();
-    auto* error = reinterpret_cast<OCIDateTime*>(err_);
-    for (OCIDateTime* wrong : {foreign, error}) {
-        EXPECT_EQ(Construct(wrong), OCI_INVALID_HANDLE);
-        EXPECT_EQ(OCIDateTimeAssign(env_, err_, wrong, value), OCI_INVALID_HANDLE);
-        EXPECT_EQ(OCIDateTimeAssign(env_, err_, value, wrong), OCI_INVALID_HANDLE);
-        EXPECT_EQ(OCIDateTimeGetDate(env_, err_, wrong, &year, &part, &part), OCI_INVALID_HANDLE);
-    }
-    EXPECT_EQ(OCIDateTimeAssign(nullptr, err_, value, value), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIDateTimeAssign(value, err_, value, value), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIDateTimeAssign(env_, nullptr, value, value), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIDescriptorFree(value, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
-    EXPECT_EQ(OCIDateTimeAssign(env_, err_, value, value), OCI_INVALID_HANDLE);
 }
 
 }  // namespace

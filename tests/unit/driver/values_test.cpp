@@ -109,26 +109,6 @@ TEST(Values, ATextOfOneByteIsItsEnd) {
     EXPECT_EQ(element.Bytes(1), std::string(1, '\0'));
 }
 
-TEST(Values, WhatFollowsTheFrame) {
-    Element element(SQLT_INT, 4);
-    element.Assign("5", 1);
-    const struct {
-        int indicator, return_code;
-        const char* shown;
-    } cases[] = {{0, 0, "5\n"}, {0, 1, "5\n"}, {-2, 0, "5\n"}, {3, 0, "5\n"}, {-1, 0, "\n"}, {0, 1406, "\n"}};
-    for (const auto& c : cases) {
-        element.indicator = static_cast<int16_t>(c.indicator);
-        element.return_code = static_cast<uint16_t>(c.return_code);
-        EXPECT_EQ(element.Show(), c.shown) << c.indicator << " " << c.return_code;
-    }
-    element.indicator = 0;
-    element.return_code = 0;
-    for (const int type : {0, 185, 186, 233, 65408}) {
-        element.type = type;
-        EXPECT_EQ(element.Show(), "") << type;
-    }
-}
-
 // Lengths that the library returned, or prefixes in the data, may say more than there is.
 TEST(Values, LengthsAreNotFollowedPastTheElement) {
     const struct { int type; uint32_t size; const char* shown; } cases[] = {

@@ -431,19 +431,6 @@ TEST_F(SqliteMeaning, DefaultsAreExpressions) {
     EXPECT_EQ(Rows("select d || '' as d from u"), "2024-02-09 00:00:00;");
 }
 
-// A statement that is kept goes with its table when that is made anew, in a database in memory, too.
-TEST_F(SqliteMeaning, StatementsFollowTheirTables) {
-    char day[] = "03-FEB-24";
-    StatementCalls insert = Another();
-    ASSERT_EQ(insert.Ready("insert into w values(:1)", {Text(day)}), 0);
-    for (const char* type : {"varchar2(20)", "date", "varchar2(20)"}) {
-        MustRun("create table w(d " + std::string(type) + ")");
-        ASSERT_EQ(insert.Execute(), 0);
-        EXPECT_EQ(Rows("select d || '' as d from w"), type[0] == 'd' ? "2024-02-03 00:00:00;" : "03-FEB-24;");
-        MustRun("drop table w");
-    }
-}
-
 TEST_F(SqliteMeaning, OnlyStatementsOfApplicationsReachTheEngine) {
     MustRun("create table t(a number)");
     for (const char* sql : {"end", "end transaction", "vacuum", "attach ':memory:' as other", "detach main", "reindex",

@@ -36,17 +36,6 @@ TEST_F(Sqlite, NumbersKeepEveryDigit) {
     }
 }
 
-TEST_F(Sqlite, LongLiteralsKeepEveryDigit) {
-    ASSERT_EQ(Run("create table t(n number)"), 0);
-    ASSERT_EQ(Run("insert into t values(-123456789012345678901234567890.5), (1), (12345678901234567890)"), 0);
-    const char* const rows = "decimal -123456789012345678901234567890.5;1;decimal 12345678901234567890;";
-    EXPECT_EQ(Query("select n from t"), rows);
-    ASSERT_EQ(Run("create table u(r raw(30))"), 0);
-    const std::string_view bytes("\0N\xC0\x80\xCA\x0D\x23\x39\x4F\x5B\x0D\x23\x39\x4F\x5B", 15);
-    ASSERT_EQ(Run("insert into u values(?1)", {View(Kind::bytes, bytes)}), 0);
-    EXPECT_EQ(Query("select r from u"), "bytes 15;") << "whatever they look like";
-}
-
 TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
     ASSERT_EQ(Run("create table t(c char(4), v varchar2(10), d date, r raw(4), b blob, i integer)"), 0);
     const date::DateTime noon{.year = 2024, .month = 2, .day = 29, .hour = 12};
@@ -228,19 +217,6 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
         {"substr('äbc', 0, 2), substr('abc', -2), substr('abc', -5, 3), substr('abc', 2, -1), substr('abc', 4),"
          " substr(1.5, 1, 2), substr(x'010203', 2)", "äb,bc,null,null,null,1.,bytes 2;"}};
     for (const auto& c : cases) EXPECT_EQ(Query(std::string("select ") + c.list), c.row) << c.list;
-}
-
-TEST_F(Sqlite, CallsAreDescribedBeforeTheyRun) {
-    const auto query = Prepared("select to_date(null), trunc(last_day(null)), to_number(null), hextoraw(null),"
-                               " nvl(add_months(null, 1), 2), decode(1, 2, months_between(null, 1)) as m");
-    const struct { const char* name; int type; } columns[] = {
-        {"TO_DATE(NULL)", SQLT_DAT}, {"TRUNC(LAST_DAY(NULL))", SQLT_DAT}, {"TO_NUMBER(NULL)", SQLT_NUM},
-        {"HEXTORAW(NULL)", SQLT_BIN}, {"NVL(ADD_MONTHS(NULL, 1), 2)", SQLT_DAT}, {"M", SQLT_NUM}};
-    ASSERT_EQ(query->Columns().size(), std::size(columns));
-    for (std::size_t index = 0; index < std::size(columns); ++index) {
-        EXPECT_EQ(query->Columns()[index].name, columns[index].name);
-        EXPECT_EQ(query->Columns()[index].type, columns[index].type) << columns[index].name;
-    }
 }
 
 TEST_F(Sqlite, ErrorsHaveTheirNumbers) {

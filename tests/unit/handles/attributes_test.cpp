@@ -267,28 +267,6 @@ TEST_F(AttributesTest, LastCall) {
     EXPECT_EQ(last(), 77u);
 }
 
-TEST_F(AttributesTest, DescribeRefuses) {
-    auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
-    const struct { const char* name; ub1 type; ub1 pointer; ub1 level; sb4 answer; } cases[] = {
-        {"nowhere", OCI_PTYPE_TABLE, OCI_OTYPE_NAME, 0, 942},   {"t", OCI_PTYPE_VIEW, OCI_OTYPE_NAME, 0, 942},
-        {"nowhere", OCI_PTYPE_UNK, OCI_OTYPE_NAME, 0, 4043},    {"t", OCI_PTYPE_SEQ, OCI_OTYPE_NAME, 0, 4043},
-        {"t", OCI_PTYPE_FUNC, OCI_OTYPE_NAME, 0, 4043},         {"t", OCI_PTYPE_COL, OCI_OTYPE_NAME, 0, 24372},
-        {"t", 255, OCI_OTYPE_NAME, 0, 24372},                   {"t", OCI_PTYPE_TABLE, OCI_OTYPE_REF, 0, 24372},
-        {"t", OCI_PTYPE_TABLE, OCI_OTYPE_PTR, 0, 24372},        {"t", OCI_PTYPE_TABLE, 4, 0, 21560},
-        {"t", OCI_PTYPE_TABLE, OCI_OTYPE_NAME, 1, 24300},       {nullptr, OCI_PTYPE_TABLE, OCI_OTYPE_NAME, 0, 21560}};
-    dvoid* parameter = nullptr;
-    for (const auto& c : cases) {
-        ASSERT_EQ(Describe(describe, "t", OCI_PTYPE_UNK), 0);
-        EXPECT_EQ(Describe(describe, c.name, c.type, c.pointer, c.level), c.answer) << int{c.type} << " " << c.answer;
-        EXPECT_EQ(Member(describe, &parameter, 1, OCI_HTYPE_DESCRIBE), 24334) << "nothing is left of the one before";
-    }
-    EXPECT_EQ(Describe(Bogus<OCIDescribe>(), "t", OCI_PTYPE_TABLE), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Answer(OCIDescribeAny(New<OCISvcCtx>(OCI_HTYPE_SVCCTX), err_, Text("t"), 1, OCI_OTYPE_NAME, 0,
-                                    OCI_PTYPE_TABLE, describe)), 3114);
-    OCIHandleFree(describe, OCI_HTYPE_DESCRIBE);
-    EXPECT_EQ(Describe(describe, "t", OCI_PTYPE_TABLE), OCI_INVALID_HANDLE);
-}
-
 TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
     ASSERT_EQ(Describe(describe, "T", OCI_PTYPE_TABLE), 0);

@@ -148,31 +148,6 @@ TEST_F(CallsTest, RecordsOfTheCallBeforeAreGoneWhenTheObjectIsNone) {
     }
 }
 
-TEST_F(CallsTest, ErrorTextIsCutAndTerminatedInAnyBuffer) {
-    OCISvcCtx* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    ASSERT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
-    const std::string whole = "[KELP/CLIENT] ORA-03114: not connected\n";
-    for (ub4 size = 0; size <= whole.size() + 2; ++size) {
-        std::string buffer(whole.size() + 8, 'x');
-        sb4 code = 0;
-        OraText state[6] = "-----";
-        const sword rc =
-            OCIErrorGet(err_, 1, state, &code, reinterpret_cast<OraText*>(buffer.data()), size, OCI_HTYPE_ERROR);
-        EXPECT_EQ(rc, size > whole.size() ? OCI_SUCCESS : OCI_ERROR) << size;
-        EXPECT_EQ(code, 3114);
-        EXPECT_STREQ(reinterpret_cast<char*>(state), "66000");
-        EXPECT_EQ(buffer[size], 'x') << "written past the end";
-        if (size > 0) {
-            EXPECT_EQ(std::string(buffer.c_str()), whole.substr(0, size - 1)) << size;
-        }
-    }
-    EXPECT_EQ(OCIErrorGet(err_, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
-    EXPECT_EQ(OCIErrorGet(err_, 0, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
-    EXPECT_EQ(OCIErrorGet(err_, 1, nullptr, nullptr, nullptr, 0, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Attribute<sb4>(err_, OCI_HTYPE_ERROR, OCI_ATTR_SQLCODE), 3114)
-        << "asking about the handle keeps its records";
-}
-
 // A message beyond what callers have room for is cut to that, and still ends its line.
 TEST_F(CallsTest, LongMessagesEndTheirLine) {
     for (const ub4 mode : {ub4{OCI_DEFAULT}, ub4{OCI_UTF16}}) {

@@ -49,18 +49,6 @@ protected:
         OCIHandleFree(stmt, OCI_HTYPE_STMT);
         return answer;
     }
-    // The number that a query answers; below 0 what it answers instead.
-    sb4 Count(OCISvcCtx* svc, const char* sql) const {
-        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-        OCIDefine* define = nullptr;
-        sb4 count = 0;
-        sb4 answer = Answer(OCIStmtPrepare(stmt, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT));
-        if (answer == 0) answer = Answer(OCIDefineByPos(stmt, &define, err_, 1, &count, sizeof count, SQLT_INT, nullptr,
-                                                        nullptr, nullptr, OCI_DEFAULT));
-        if (answer == 0) answer = Answer(OCIStmtExecute(svc, stmt, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
-        OCIHandleFree(stmt, OCI_HTYPE_STMT);
-        return answer == 0 ? count : -answer;
-    }
     OCIServer* NewServer(const char* database) const {
         auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
         EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(database), static_cast<sb4>(Length(database)), 0)), 0);
@@ -82,35 +70,6 @@ protected:
     }
 };
 
-TEST_F(Sessions, TheEndCommitsAndADetachRollsBack) {
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, "work"), 0);
-    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
-    ASSERT_EQ(Run(svc, "insert into t values(1)"), 0);
-    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
-    ASSERT_EQ(LogOn(&svc, "work"), 0);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 1) << "a logoff commits";
-
-    OCIServer* server = NewServer("work");
-    auto* session = New<OCISession>(OCI_HTYPE_SESSION);
-    OCISvcCtx* explicit_svc = NewContext(server, session);
-    ASSERT_EQ(Answer(OCISessionBegin(explicit_svc, err_, session, OCI_CRED_EXT, 0)), 0);
-    ASSERT_EQ(Run(explicit_svc, "insert into t values(2)"), 0);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 1);
-    ASSERT_EQ(Answer(OCISessionEnd(explicit_svc, err_, session, 0)), 0);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "the end of a session commits";
-
-    ASSERT_EQ(Answer(OCISessionBegin(explicit_svc, err_, session, OCI_CRED_EXT, 0)), 0);
-    ASSERT_EQ(Run(explicit_svc, "insert into t values(3)"), 0);
-    ASSERT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "a detach drops what is open";
-    ASSERT_EQ(Run(svc, "insert into t values(4)"), 0);
-    ASSERT_EQ(OCIHandleFree(svc, OCI_HTYPE_SVCCTX), OCI_SUCCESS);
-    svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, "work"), 0);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 2) << "and so does freeing the context";
-}
-
 // What fails outside of a transaction leaves none behind: nobody has to wait for it.
 TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
     OCISvcCtx *first = nullptr, *second = nullptr;
@@ -127,23 +86,6 @@ TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
     }
 }
 
-TEST_F(Sessions, BreakMeetsOneCall) {
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
-    ASSERT_EQ(Run(svc, "create table t(n integer)"), 0);
-    const auto interrupt = [&] { EXPECT_EQ(Answer(OCIBreak(svc, err_)), 0); };
-    interrupt();
-    EXPECT_EQ(Count(svc, "select 1 from dual"), -1013);
-    EXPECT_EQ(Count(svc, "select 1 from dual"), 1);
-    interrupt();
-    EXPECT_EQ(Answer(OCIReset(svc, err_)), 0);
-    EXPECT_EQ(Run(svc, "insert into t values(1)"), 0);
-    interrupt();
-    EXPECT_EQ(Run(svc, "commit"), 0) << "what ends a transaction is not stopped";
-    EXPECT_EQ(Run(svc, "insert into t values(2)"), 1013);
-    EXPECT_EQ(Count(svc, "select count(*) from t"), 1);
-}
-
 TEST_F(Sessions, AttributesFollowWhatHappens) {
     OCISvcCtx* svc = nullptr;
     ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text("here"), 4, OCI_LOGON2_STMTCACHE)), 0);
@@ -157,19 +99,6 @@ TEST_F(Sessions, AttributesFollowWhatHappens) {
     EXPECT_EQ(open(), 0u);
     EXPECT_EQ(Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION), nullptr);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 0u) << "goes with the logon";
-
-    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
-    const auto database = [&] {
-        const char* name = nullptr;
-        ub4 length = 9;
-        EXPECT_EQ(Answer(OCIAttrGet(server, OCI_HTYPE_SERVER, &name, &length, OCI_ATTR_DBNAME, err_)), 0);
-        return std::string(name ? name : "", length);
-    };
-    EXPECT_EQ(database(), "");
-    ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text("here"), 4, 0)), 0);
-    EXPECT_EQ(database(), "here");
-    ASSERT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
-    EXPECT_EQ(database(), "") << "detached";
 }
 
 // ---- Several threads

@@ -54,29 +54,6 @@ INSTANTIATE_TEST_SUITE_P(Forms, NumberCalls, testing::Values(OCI_DEFAULT, OCI_UT
 
 }  // namespace
 
-TEST_P(NumberCalls, MissingHandlesAndPointers) {
-    OCINumber one = Number("1"), result;
-    char memory[15] = {};
-    EXPECT_EQ(OCINumberAdd(nullptr, &one, &one, &result), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCINumberAdd(reinterpret_cast<OCIError*>(memory), &one, &one, &result), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCINumberSin(nullptr, nullptr, nullptr), OCI_INVALID_HANDLE);
-    const sword codes[] = {
-        OCINumberAdd(error_, nullptr, &one, &result), OCINumberAdd(error_, &one, &one, nullptr),
-        OCINumberSqrt(error_, nullptr, &result), OCINumberInc(error_, nullptr), OCINumberSign(error_, &one, nullptr),
-        OCINumberCmp(error_, &one, nullptr, nullptr), OCINumberFromInt(error_, nullptr, 4, OCI_NUMBER_SIGNED, &result),
-        OCINumberToReal(error_, &one, 8, nullptr), OCINumberToReal(error_, &one, 0, memory),
-        OCINumberToRealArray(error_, nullptr, 3, 8, memory),
-        OCINumberFromText(error_, nullptr, 5, nullptr, 0, nullptr, 0, &result),
-        OCINumberToText(error_, &one, nullptr, 0, nullptr, 0, nullptr, nullptr),
-    };
-    for (const sword code : codes) EXPECT_EQ(code, OCI_ERROR);
-    EXPECT_EQ(Recorded(), 21560);
-    OCINumberSetZero(nullptr, &result);
-    OCINumberSetPi(error_, nullptr);
-    EXPECT_EQ(OCINumberAdd(error_, &one, &result, &result), OCI_SUCCESS);
-    EXPECT_EQ(Recorded(), 0);
-}
-
 TEST_P(NumberCalls, TheRecordNamesTheMalformedNumber) {
     OCINumber one = Number("1"), malformed{}, result;
     EXPECT_EQ(OCINumberMul(error_, &one, &malformed, &result), OCI_ERROR);
@@ -85,28 +62,6 @@ TEST_P(NumberCalls, TheRecordNamesTheMalformedNumber) {
     ASSERT_EQ(OCIErrorGet(error_, 1, nullptr, nullptr, text, sizeof text, OCI_HTYPE_ERROR), OCI_SUCCESS);
     const std::string wanted = Bytes("number 2");
     EXPECT_NE(std::string(reinterpret_cast<char*>(text), sizeof text).find(wanted), std::string::npos);
-}
-
-TEST_P(NumberCalls, IntegersOfOtherLengthsAndFlags) {
-    OCINumber one = Number("1"), minus = Number("-1");
-    ub4 integer = 7;
-    EXPECT_EQ(OCINumberToInt(error_, &one, 3, OCI_NUMBER_SIGNED, nullptr), OCI_ERROR);
-    EXPECT_EQ(Recorded(), 22057);
-    EXPECT_EQ(OCINumberToInt(error_, &one, 4, 1, &integer), OCI_ERROR);
-    EXPECT_EQ(Recorded(), 22055);
-    EXPECT_EQ(OCINumberToInt(error_, &minus, 4, OCI_NUMBER_UNSIGNED, &integer), OCI_ERROR);
-    EXPECT_EQ(Recorded(), 22054);
-    EXPECT_EQ(integer, 7u) << "untouched by a failure";
-}
-
-TEST_P(NumberCalls, RealArraysStopAtTheFirstFailure) {
-    OCINumber one = Number("1"), huge = Number("1e100");
-    const OCINumber* numbers[] = {&one, &huge, &one};
-    float reals[] = {0, 0, 0};
-    EXPECT_EQ(OCINumberToRealArray(error_, numbers, 3, sizeof(float), reals), OCI_ERROR);
-    EXPECT_EQ(Recorded(), 22053);
-    EXPECT_EQ(reals[0], 1);
-    EXPECT_EQ(reals[2], 0);
 }
 
 TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {

@@ -8,43 +8,6 @@
 #include "number/decimal_float.h"
 #include "reference.h"
 
-namespace {
-
-// The text of an integer of any width, as a number.
-OCINumber Whole(__int128 value) {
-    std::string digits;
-    for (unsigned __int128 rest = value < 0 ? -static_cast<unsigned __int128>(value)
-                                            : static_cast<unsigned __int128>(value);
-         rest > 0; rest /= 10)
-        digits.insert(digits.begin(), static_cast<char>('0' + static_cast<int>(rest % 10)));
-    return Number((value < 0 ? "-" : "") + (digits.empty() ? "0" : digits));
-}
-
-}  // namespace
-
-TEST(NumberIntegers, EndsOfEveryWidthAndSign) {
-    for (const std::size_t length : {1u, 2u, 4u, 8u}) {
-        for (const bool is_signed : {false, true}) {
-            const auto span = static_cast<__int128>(1) << (8 * length);
-            const __int128 low = is_signed ? -span / 2 : 0, high = low + span - 1;
-            for (const __int128 value : {low, low + 1, static_cast<__int128>(0), static_cast<__int128>(99),
-                                         static_cast<__int128>(100), high - 1, high}) {
-                std::uint64_t bits = 0;
-                OCINumber back;
-                ASSERT_EQ(number::ToInteger(Whole(value), length, is_signed, &bits), 0) << length << is_signed;
-                ASSERT_EQ(number::FromInteger(&bits, length, is_signed, &back), 0);
-                EXPECT_EQ(back, Whole(value)) << length << is_signed;
-            }
-            std::uint64_t bits = 0;
-            OCINumber over = Whole(high + 1), fraction;
-            EXPECT_EQ(number::ToInteger(over, length, is_signed, &bits), 22053);
-            EXPECT_EQ(number::ToInteger(Whole(low - 1), length, is_signed, &bits), 22054);
-            ASSERT_EQ(number::Sub(over, Number("1E-15"), &fraction), 0);
-            EXPECT_EQ(number::ToInteger(fraction, length, is_signed, &bits), 0) << "a fraction is dropped";
-        }
-    }
-}
-
 TEST(NumberIntegers, WhatNoIntegerHolds) {
     std::uint64_t bits = 0;
     EXPECT_EQ(number::ToInteger(Number("1E30"), 8, true, &bits), 22053);

@@ -91,31 +91,6 @@ TEST(BinaryReals, FunctionsAreRightToTheBitsTheyPromise) {
     }
 }
 
-TEST(BinaryReals, ArithmeticIsRightToTheLastBits) {
-    RandomNumbers numbers(5);
-    for (int i = 0; i < 2000; ++i) {
-        const int limbs = kPrecisions[i % std::size(kPrecisions)];
-        const BigReal a = Read(limbs, numbers.Next(i % 3 == 0 ? 20 : 1)), b = Read(limbs, numbers.Next(1));
-        Real a_real(a), b_real(b), wanted;
-        const struct {
-            const char* name;
-            BigReal got;
-            int (*reference)(mpfr_ptr, mpfr_srcptr, mpfr_srcptr, mpfr_rnd_t);
-        } rows[] = {{"+", a + b, mpfr_add}, {"-", a - b, mpfr_sub}, {"*", a * b, mpfr_mul}, {"/", a / b, mpfr_div}};
-        // Where a sum cancels, the error is measured by the larger operand.
-        const long most = std::max(a.Exponent(), b.Exponent());
-        for (const auto& row : rows) {
-            row.reference(wanted, a_real, b_real, MPFR_RNDN);
-            const bool sum = *row.name == '+' || *row.name == '-';
-            const long cancelled = sum && !row.got.IsZero() ? most - row.got.Exponent() : 0;
-            ASSERT_GE(RightBits(row.got, wanted) + std::max(cancelled, 0L), 64 * limbs - 3)
-                << i << ": " << row.name << " with " << limbs << " limbs";
-        }
-        mpfr_sqrt(wanted, Real(a.Magnitude()), MPFR_RNDN);
-        ASSERT_GE(RightBits(a.Magnitude().SquareRoot(), wanted), 64 * limbs - 3) << i;
-    }
-}
-
 TEST(BinaryReals, NearestWholeNumberAndItsQuarter) {
     const struct {
         const char* value;

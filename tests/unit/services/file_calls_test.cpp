@@ -186,30 +186,6 @@ TEST_F(FileCalls, StandardFilesStayOpen) {
     EXPECT_NE(fcntl(STDIN_FILENO, F_GETFD), -1);
 }
 
-TEST_F(FileCalls, BadArguments) {
-    Fill("some", "x");
-    OCIFileObject* file = MustOpen("some", OCI_FILE_READ_WRITE, OCI_FILE_EXIST);
-    char area[4];
-    ub4 count = 0;
-    const struct { sb4 got, answer; } cases[] = {
-        {Answer(OCIFileOpen(env_, err_, nullptr, Text("some"), nullptr, 1, 0, 0)), 30150},
-        {Answer(OCIFileOpen(env_, err_, &file, nullptr, nullptr, 1, 0, 0)), 30150},
-        {Answer(OCIFileRead(env_, err_, file, nullptr, 1, &count)), 30150},
-        {Answer(OCIFileRead(env_, err_, file, area, 1, nullptr)), 30150},
-        {Answer(OCIFileWrite(env_, err_, file, nullptr, 1, &count)), 30150},
-        {Answer(OCIFileWrite(env_, err_, file, area, 1, nullptr)), 30150},
-        {Answer(OCIFileRead(env_, err_, file, area, kHuge, &count)), 30150},
-        {Answer(OCIFileWrite(env_, err_, file, area, kHuge, &count)), 30150},
-        {Answer(OCIFileExists(env_, err_, Text("some"), nullptr, nullptr)), 30150},
-        {Answer(OCIFileGetLength(env_, err_, nullptr, nullptr, nullptr)), 30150},
-        {Answer(OCIFileRead(env_, err_, nullptr, area, 1, &count)), 30153},
-        {Answer(OCIFileClose(env_, err_, Bogus<OCIFileObject>())), 30153},
-        {Answer(OCIFileFlush(env_, err_, reinterpret_cast<OCIFileObject*>(env_))), 30153},
-        {Answer(OCIFileClose(nullptr, err_, file)), OCI_INVALID_HANDLE},
-        {Answer(OCIFileClose(env_, nullptr, file)), OCI_INVALID_HANDLE}};
-    for (const auto& c : cases) EXPECT_EQ(c.got, c.answer) << &c - cases;
-}
-
 TEST_F(FileCalls, NamesInUtf16) {
     Reopen(OCI_UTF16);
     const std::filesystem::path folder(folder_);
@@ -269,17 +245,6 @@ TEST_F(FileCalls, ClosedWhileOthersWaitForTheirTurn) {
         EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 30153);
     }
     close(other_end);
-}
-
-TEST_F(FileCalls, NothingWorksOutsideOfThePackage) {
-    OCIFileObject* file = MustOpen("x", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE);
-    ASSERT_EQ(OCIFileTerm(env_, err_), OCI_SUCCESS);
-    ub1 flag = 0;
-    EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 30150);
-    EXPECT_EQ(Answer(OCIFileExists(env_, err_, Text("x"), nullptr, &flag)), 30150);
-    EXPECT_EQ(Answer(OCIFileTerm(env_, err_)), 30150);
-    ASSERT_EQ(OCIFileInit(env_, err_), OCI_SUCCESS);
-    EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 0);
 }
 
 }  // namespace

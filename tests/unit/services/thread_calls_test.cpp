@@ -43,11 +43,6 @@ protected:
         EXPECT_EQ(OCIThreadIdSame(env_, err_, left, right, &same), OCI_SUCCESS);
         return same;
     }
-    boolean IsNull(OCIThreadId* id) {
-        boolean null = 9;
-        EXPECT_EQ(OCIThreadIdNull(env_, err_, id, &null), OCI_SUCCESS);
-        return null;
-    }
 };
 
 // What a thread of the tests works with, and what went wrong in it.
@@ -61,52 +56,6 @@ struct Work {
     long counter = 0;
     std::atomic<int> failures{0};
 };
-
-TEST_F(ThreadCalls, MutexesAreNotRecursive) {
-    OCIThreadMutex* mutex = NewMutex();
-    EXPECT_EQ(Answer(OCIThreadMutexRelease(env_, err_, mutex)), 21560);
-    EXPECT_EQ(Answer(OCIThreadMutexAcquire(env_, err_, mutex)), 0);
-    EXPECT_EQ(Answer(OCIThreadMutexAcquire(env_, err_, mutex)), 21560);
-    EXPECT_EQ(Answer(OCIThreadMutexDestroy(env_, err_, &mutex)), 21560);
-    std::thread([&] {
-        dvoid* err = nullptr;
-        OCIHandleAlloc(env_, &err, OCI_HTYPE_ERROR, 0, nullptr);
-        EXPECT_EQ(OCIThreadMutexRelease(env_, static_cast<OCIError*>(err), mutex), OCI_ERROR) << "held by another";
-    }).join();
-    EXPECT_EQ(Answer(OCIThreadMutexRelease(env_, err_, mutex)), 0);
-    OCIThreadMutex* const gone = mutex;
-    EXPECT_EQ(Answer(OCIThreadMutexDestroy(env_, err_, &mutex)), 0);
-    EXPECT_EQ(mutex, nullptr);
-    EXPECT_EQ(OCIThreadMutexAcquire(env_, err_, gone), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Answer(OCIThreadMutexDestroy(env_, err_, &mutex)), 21560);
-}
-
-TEST_F(ThreadCalls, IdentifiersTellThreadsApart) {
-    OCIThreadId *mine = NewId(), *again = NewId(), *other = NewId();
-    EXPECT_TRUE(IsNull(mine));
-    EXPECT_TRUE(Same(mine, again));
-    ASSERT_EQ(OCIThreadIdGet(env_, err_, mine), OCI_SUCCESS);
-    ASSERT_EQ(OCIThreadIdGet(env_, err_, again), OCI_SUCCESS);
-    EXPECT_FALSE(IsNull(mine));
-    EXPECT_TRUE(Same(mine, again));
-    Work work{env_, err_};
-    work.id = NewId();
-    OCIThreadHandle* handle = NewHandle();
-    const auto routine = [](dvoid* given) {
-        auto* mine_alone = static_cast<Work*>(given);
-        mine_alone->failures += OCIThreadIdGet(mine_alone->env, mine_alone->err, mine_alone->id) != OCI_SUCCESS;
-    };
-    ASSERT_EQ(Answer(OCIThreadCreate(env_, err_, routine, &work, other, handle)), 0);
-    EXPECT_FALSE(IsNull(other));
-    ASSERT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 0);
-    EXPECT_EQ(work.failures, 0);
-    EXPECT_TRUE(Same(work.id, other)) << "what the creator was told is what the thread sees";
-    EXPECT_FALSE(Same(mine, other));
-    ASSERT_EQ(OCIThreadIdSet(env_, err_, again, other), OCI_SUCCESS);
-    EXPECT_TRUE(Same(again, other));
-    ASSERT_EQ(OCIThreadIdSetNull(env_, err_, again), OCI_SUCCESS);
-    EXPECT_TRUE(IsNull(again));
-}
 
 TEST_F(ThreadCalls, HandlesAreJoinedOnceAndClosedOnce) {
     OCIThreadHandle* handle = NewHandle();
@@ -222,37 +171,6 @@ TEST_F(ThreadCalls, ManyThreadsAtOnce) {
     EXPECT_EQ(work.failures, 0);
     EXPECT_EQ(work.counter, kThreads * kRounds);
     EXPECT_EQ(destroyed, kThreads);
-}
-
-TEST_F(ThreadCalls, BadArguments) {
-    OCIThreadMutex* mutex = NewMutex();
-    OCIThreadKey* key = NewKey();
-    OCIThreadId* id = NewId();
-    OCIThreadHandle* handle = NewHandle();
-    OCIThreadMutex* const before = mutex;
-    EXPECT_EQ(Answer(OCIThreadMutexInit(env_, err_, &mutex)), 21560) << "it lives already";
-    EXPECT_EQ(mutex, before);
-    boolean flag = 0;
-    const sb4 nulls[] = {
-        Answer(OCIThreadMutexInit(env_, err_, nullptr)), Answer(OCIThreadMutexDestroy(env_, err_, nullptr)),
-        Answer(OCIThreadMutexAcquire(env_, err_, nullptr)), Answer(OCIThreadKeyInit(env_, err_, nullptr, nullptr)),
-        Answer(OCIThreadKeyGet(env_, err_, key, nullptr)), Answer(OCIThreadKeySet(env_, err_, nullptr, nullptr)),
-        Answer(OCIThreadIdInit(env_, err_, nullptr)), Answer(OCIThreadIdSet(env_, err_, id, nullptr)),
-        Answer(OCIThreadIdSame(env_, err_, nullptr, id, &flag)), Answer(OCIThreadIdSame(env_, err_, id, id, nullptr)),
-        Answer(OCIThreadIdNull(env_, err_, id, nullptr)), Answer(OCIThreadIdGet(env_, err_, nullptr)),
-        Answer(OCIThreadHndInit(env_, err_, nullptr)), Answer(OCIThreadJoin(env_, err_, nullptr)),
-        Answer(OCIThreadClose(env_, err_, nullptr)), Answer(OCIThreadHandleGet(env_, err_, nullptr))};
-    for (const sb4& answer : nulls) EXPECT_EQ(answer, 21560) << &answer - nulls;
-    const sword foreign[] = {
-        OCIThreadMutexAcquire(env_, err_, Bogus<OCIThreadMutex>()),
-        OCIThreadKeySet(env_, err_, Bogus<OCIThreadKey>(), nullptr),
-        OCIThreadIdSet(env_, err_, id, Bogus<OCIThreadId>()), OCIThreadJoin(env_, err_, Bogus<OCIThreadHandle>()),
-        OCIThreadMutexAcquire(env_, err_, reinterpret_cast<OCIThreadMutex*>(key)),
-        OCIThreadCreate(env_, err_, CountDestroyed, nullptr, Bogus<OCIThreadId>(), nullptr),
-        OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, Bogus<OCIThreadHandle>()),
-        OCIThreadInit(nullptr, err_), OCIThreadJoin(env_, nullptr, handle), OCIThreadTerm(id, err_)};
-    for (const sword code : foreign) EXPECT_EQ(code, OCI_INVALID_HANDLE) << &code - foreign;
-    EXPECT_EQ(destroyed, 0);
 }
 
 TEST_F(ThreadCalls, NothingWorksOutsideOfThePackage) {

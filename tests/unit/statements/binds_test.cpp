@@ -64,25 +64,6 @@ TEST_F(Binds, ManyBindsAndDefinesLeaveNothingBehind) {
     EXPECT_EQ(blocks(), held);
 }
 
-TEST_F(Binds, ArrayOfStructures) {
-    MustRun("create table t(a number, b varchar2(10))");
-    struct Row {
-        sb8 id;
-        char name[8];
-        sb2 indicator;
-        ub2 length;
-    } rows[3] = {{1, "one", 0, 3}, {2, "two", -1, 3}, {3, "three", 0, 2}};
-    OCIBind* id = nullptr;
-    OCIBind* name = nullptr;
-    ASSERT_EQ(Prepare("insert into t values(:1, :2)"), 0);
-    ASSERT_EQ(Bind(&id, 1, Int(rows[0].id)), 0);
-    ASSERT_EQ(Bind(&name, 2, {rows[0].name, 8, SQLT_CHR, &rows[0].indicator, &rows[0].length}), 0);
-    ASSERT_EQ(OCIBindArrayOfStruct(id, err, sizeof(Row), 0, 0, 0), OCI_SUCCESS);
-    ASSERT_EQ(OCIBindArrayOfStruct(name, err, sizeof(Row), sizeof(Row), sizeof(Row), 0), OCI_SUCCESS);
-    ASSERT_EQ(Execute(3), 0);
-    EXPECT_EQ(One("select group_concat(a || coalesce(b, '-')) from t"), "1one,2-,3th");
-}
-
 TEST_F(Binds, WhatThereIsToBind) {
     ASSERT_EQ(Prepare("insert into t values(:first, :second:ind, :FIRST, :\"Quoted\", ?)"), 0);
     sb4 value = 1;

@@ -137,23 +137,6 @@ TEST_F(Blocks, TablesAtTheirLimits) {
     }
 }
 
-// A plain bind is one element, however many a table beside it has; another table takes as many as there are.
-TEST_F(Blocks, FromATable) {
-    const struct { const char* block; bool plain; std::array<sb4, 3> out; ub4 returned; } cases[] = {
-        {"begin :out := :in; end;", true, {6, -1, -1}, 0},
-        {"begin insert into t values(:in) returning a * 2 into :out; end;", false, {8, 10, 12}, 3}};
-    for (const auto& c : cases) {
-        std::array<sb4, 3> in = {4, 5, 6}, out = {-1, -1, -1};
-        ub4 current = 3, returned = 0;
-        ASSERT_EQ(Prepare(c.block), 0);
-        ASSERT_EQ(BindName("in", Int(in), 3, &current), 0);
-        ASSERT_EQ(c.plain ? BindName("out", Int(out)) : BindName("out", Int(out), 3, &returned), 0);
-        ASSERT_EQ(Execute(), 0) << c.block;
-        EXPECT_EQ(out, c.out) << c.block;
-        EXPECT_EQ(returned, c.returned) << c.block;
-    }
-}
-
 // A value that does not fit its place undoes the row that gave it.
 TEST_F(Blocks, ReturningWhatDoesNotFit) {
     const struct { ub4 mode; sb4 answer; ub4 done; const char* rows; sb1 third; } cases[] = {

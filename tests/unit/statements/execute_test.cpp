@@ -25,21 +25,6 @@ protected:
     }
 };
 
-TEST_F(Executing, TypeAndStateOfAStatement) {
-    MustRun("create table t(a number)");
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_STMT_TYPE), OCI_STMT_CREATE);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_SQLFNCODE), 1);
-    ASSERT_EQ(Prepare("select a, a + 1 from t where a = :x or a = :y or a = :x"), 0);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_STMT_TYPE), OCI_STMT_SELECT);
-    EXPECT_EQ(State(), 1u);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_BIND_COUNT), 3u);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_PARAM_COUNT), 0u);
-    ASSERT_EQ(Execute(0, OCI_DESCRIBE_ONLY), 0);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_PARAM_COUNT), 2u);
-    EXPECT_EQ(State(), 1u) << "described, not executed";
-    EXPECT_EQ(Fetch(), 24338);
-}
-
 TEST_F(Executing, WhatIsWrongWithTheCall) {
     MustRun("create table t(a number)");
     stmt = New<OCIStmt>(OCI_HTYPE_STMT);
@@ -68,14 +53,8 @@ TEST_F(Executing, SyntaxErrorsPointIntoTheText) {
     ASSERT_EQ(Ready("select :a, sysdate, from dual", {Text(dummy)}), 0);
     EXPECT_EQ(Execute(0), 900);
     EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 20);
-    const struct { const char* sql; sb4 answer; ub2 offset; } cases[] = {
-        {"select 1 from dual", 0, 0}, {"select 2, 'x from dual", 1756, 10}, {"select 1 from dual", 0, 0}};
-    for (const auto& c : cases) {
-        ASSERT_EQ(Prepare(c.sql), 0);
-        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
-        EXPECT_EQ(Execute(0), c.answer);
-        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), c.offset);
-    }
+    ASSERT_EQ(Prepare("select 1 from dual"), 0);
+    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
 }
 
 TEST_F(Executing, TheMomentInDefaultsAndLists) {
@@ -114,20 +93,6 @@ TEST_F(Executing, ParseOnlyRunsNothingAndComesFirst) {
     EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 24382);
     ASSERT_EQ(Prepare("insert into missing values(1)"), 0);
     EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 942);
-}
-
-TEST_F(Executing, ArrayTakesItsRowsFromTheOffsetOn) {
-    MustRun("create table t(a number, b varchar2(10))");
-    sb4 numbers[5] = {10, 20, 30, 40, 50};
-    char texts[5][4] = {"aa", "bb", "cc", "dd", "ee"};
-    sb2 indicators[5] = {0, 0, -1, 0, 0};
-    ASSERT_EQ(Ready("insert into t values(:1, :2)", {Int(numbers), Text(texts, indicators)}), 0);
-    ASSERT_EQ(Execute(4, OCI_DEFAULT, 1), 0);
-    EXPECT_EQ(RowCount(), 3u);
-    EXPECT_EQ(One("select group_concat(a || coalesce(b, '-')) from t"), "20bb,30-,40dd");
-    numbers[1] = 21;
-    ASSERT_EQ(Execute(2, OCI_DEFAULT, 1), 0) << "the buffers are read when it runs";
-    EXPECT_EQ(One("select max(a) from t where b = 'bb'"), "21");
 }
 
 // Rows 1 and 3 break the constraint: without batch errors the first ends it, with them the others are done and counted.
@@ -178,28 +143,6 @@ TEST_F(Executing, ValueThatCannotBeReadFailsItsRow) {
     EXPECT_EQ(Rows(), "1");
 }
 
-// What a rollback leaves. A definition commits what came before even if it fails in running, but not in compiling.
-TEST_F(Executing, Transactions) {
-    MustRun("create table t(a number)");
-    const struct { std::vector<const char*> texts; sb4 last; const char* left; } cases[] = {
-        {{"insert into t values(1)"}, 0, "0"},
-        {{"insert into t values(1)", "savepoint s", "insert into t values(2)", "rollback to s", "commit work"}, 0, "1"},
-        {{"insert into t values(3)", "create table u(a number)"}, 0, "1"},
-        {{"insert into t values(1)", "create tabel u(a number)"}, 900, "0"},
-        {{"insert into t values(1)", "insert into t values(1)", "create unique index i on t(a)"}, 1, "2"}};
-    for (const auto& c : cases) {
-        MustRun("delete from t", "commit");
-        for (const char* sql : c.texts) EXPECT_EQ(Run(sql), sql == c.texts.back() ? c.last : 0) << sql;
-        MustRun("rollback");
-        EXPECT_EQ(Rows(), c.left) << c.texts.back();
-    }
-    MustRun("delete from t", "commit");
-    ASSERT_EQ(Prepare("insert into t values(4)"), 0);
-    ASSERT_EQ(Execute(1, OCI_COMMIT_ON_SUCCESS), 0);
-    MustRun("rollback");
-    EXPECT_EQ(Rows(), "1");
-}
-
 // The session counts the results that are open.
 TEST_F(Executing, OpenStatementsAreCounted) {
     OCISession* session = nullptr;
@@ -247,28 +190,6 @@ TEST_F(Executing, ThroughAnotherSession) {
         }
     }
     EXPECT_EQ(OCILogoff(services[0], err), OCI_SUCCESS);
-}
-
-TEST_F(Executing, OpenQueryOutlivesCommitAndOtherStatements) {
-    MustRun("create table t(a number)", "insert into t values(1), (2)");
-    OCIStmt* const query = New<OCIStmt>(OCI_HTYPE_STMT);
-    OCIStmt* const other = std::exchange(stmt, query);
-    sb4 value = 0;
-    ASSERT_EQ(Query("select a from t order by a", {Int(value)}, 0), 0);
-    ASSERT_EQ(Fetch(), 0);
-    stmt = other;
-    MustRun("commit", "insert into t values(3)");
-    stmt = query;
-    EXPECT_EQ(Fetch(), 0);
-    EXPECT_EQ(value, 2);
-    ASSERT_EQ(Execute(0), 0) << "executing again begins anew";
-    ASSERT_EQ(Fetch(), 0);
-    EXPECT_EQ(value, 1);
-    stmt = other;
-    MustRun("insert into t values(4)");
-    stmt = query;
-    EXPECT_EQ(Fetch(), 0);
-    EXPECT_EQ(value, 2) << "whatever was read ahead before";
 }
 
 TEST_F(Executing, LogoffEndsWhatIsOpen) {

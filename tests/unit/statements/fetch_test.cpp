@@ -127,18 +127,6 @@ TEST_F(Fetching, BadRowInTheMiddle) {
     }
 }
 
-TEST_F(Fetching, ExecuteDeliversRowsFromTheOffset) {
-    ASSERT_EQ(Query("select id from t order by id", {Int(ids_)}, 0), 0);
-    ASSERT_EQ(Execute(5, OCI_DEFAULT, 2), 0);
-    EXPECT_EQ(ids_[1], 0);
-    EXPECT_EQ(ids_[2], 1);
-    EXPECT_EQ(ids_[4], 3);
-    EXPECT_EQ(Fetch(2), 0);
-    EXPECT_EQ(ids_[0], 4);
-    EXPECT_EQ(Execute(10), 1403) << "fewer rows than asked for";
-    EXPECT_EQ(RowsFetched(), 7u);
-}
-
 TEST_F(Fetching, ExactFetch) {
     const struct { ub4 rows; sword rc; sb4 number; sb4 fetch; } cases[] = {
         {7, OCI_SUCCESS, 0, 1002}, {6, OCI_ERROR, 1422, 24374}, {8, OCI_NO_DATA, 1403, 1002}};
@@ -172,33 +160,6 @@ TEST_F(Fetching, Scrolling) {
     EXPECT_EQ(Fetch(1, OCI_FETCH_ABSOLUTE, 3), 0);
     EXPECT_EQ(RowCount(), 7u);
     EXPECT_EQ(indicators_[0], -1);
-}
-
-TEST_F(Fetching, ArrayOfStructures) {
-    struct Row {
-        sb8 id;
-        char name[8];
-        sb2 indicator;
-        ub2 length, code;
-    } rows[3] = {};
-    ASSERT_EQ(Prepare("select id, name from t order by id"), 0);
-    OCIDefine* id = nullptr;
-    OCIDefine* name = nullptr;
-    ASSERT_EQ(Define(&id, 1, Int(rows[0].id)), 0);
-    ASSERT_EQ(Define(&name, 2, {rows[0].name, 8, SQLT_CHR, &rows[0].indicator, &rows[0].length, &rows[0].code}), 0);
-    ASSERT_EQ(OCIDefineArrayOfStruct(id, err, sizeof(Row), 0, 0, 0), OCI_SUCCESS);
-    ASSERT_EQ(OCIDefineArrayOfStruct(name, err, sizeof(Row), sizeof(Row), sizeof(Row), sizeof(Row)), OCI_SUCCESS);
-    ASSERT_EQ(Execute(3), 0);
-    EXPECT_EQ(rows[2].id, 3);
-    EXPECT_EQ(rows[2].indicator, -1);
-    EXPECT_EQ(rows[2].code, 1405);
-    EXPECT_EQ(std::string(rows[1].name, rows[1].length), "row 2");
-    sb8 ids[3] = {};
-    sb2 indicators[3] = {9, 9, 9};
-    char names[3][8];
-    ASSERT_EQ(Define(&id, 1, Int(ids)) + Define(&name, 2, Text(names, indicators)) + Execute(3), 0) << "plain arrays again";
-    EXPECT_EQ(ids[2], 3);
-    EXPECT_TRUE(indicators[1] == 0 && indicators[2] == -1) << indicators[1] << indicators[2];
 }
 
 TEST_F(Fetching, DefinesMayBeMadeAnewAndFreed) {

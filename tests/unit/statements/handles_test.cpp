@@ -8,35 +8,6 @@ namespace {
 
 class Handles : public StatementTest {};
 
-// One variable for all handles: each keeps the place that it was made for.
-TEST_F(Handles, OneVariableForAllPositions) {
-    sb4 in[3] = {1, 2, 3};
-    std::array<sb4, 3> out = {};
-    OCIBind* bind = nullptr;
-    OCIDefine* define = nullptr;
-    OCIBind* binds[3] = {};
-    OCIDefine* defines[3] = {};
-    ASSERT_EQ(Prepare("select :1 + 10, :2 + 20, :3 + 30 from dual"), 0);
-    for (ub4 place = 0; place < 3; ++place) {
-        ASSERT_EQ(Bind(&bind, place + 1, Int(in[place])), 0);
-        ASSERT_EQ(Define(&define, place + 1, Int(out[place])), 0);
-        binds[place] = bind;
-        defines[place] = define;
-        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_HANDLE_POSITION, bind, OCI_HTYPE_BIND), place + 1);
-        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_HANDLE_POSITION, define, OCI_HTYPE_DEFINE), place + 1);
-    }
-    EXPECT_NE(binds[0], binds[1]);
-    EXPECT_NE(defines[0], defines[1]);
-    ASSERT_EQ(Execute(1), 0);
-    EXPECT_EQ(out, (std::array<sb4, 3>{11, 22, 33}));
-    ASSERT_EQ(Define(&define, 3, Int(out[0])), 0);
-    EXPECT_EQ(define, defines[2]) << "the same place once more";
-    ASSERT_EQ(Bind(&bind, 3, Int(in[0])), 0);
-    EXPECT_EQ(bind, binds[2]);
-    ASSERT_EQ(Execute(1), 0);
-    EXPECT_EQ(out[0], 31);
-}
-
 // The same variable for another statement: the first one keeps what it has.
 TEST_F(Handles, OneVariableForTwoStatements) {
     OCIStmt* const first = stmt;
@@ -148,23 +119,6 @@ TEST_F(Handles, ColumnNamesStay) {
     ASSERT_EQ(OCIDescriptorFree(parameter, OCI_DTYPE_PARAM), OCI_SUCCESS);
     EXPECT_EQ(first, "A_NAME_LONGER_THAN_A_SHORT_ONE");
     EXPECT_EQ(second, "ANOTHER_NAME_THAT_IS_LONG_TOO");
-}
-
-// Each set toggles, a null as well; server and service context show the same.
-TEST_F(Handles, NonBlockingModeToggles) {
-    OCIServer* server = nullptr;
-    ASSERT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &server, nullptr, OCI_ATTR_SERVER, err)), 0);
-    ub1 one = 1;
-    const struct { dvoid* handle; ub4 type; ub1* value; ub1 mode; } cases[] = {
-        {server, OCI_HTYPE_SERVER, nullptr, 1}, {server, OCI_HTYPE_SERVER, &one, 0}, {svc, OCI_HTYPE_SVCCTX, &one, 1},
-        {svc, OCI_HTYPE_SVCCTX, nullptr, 0}};
-    for (const auto& c : cases) {
-        ASSERT_EQ(Answer(OCIAttrSet(c.handle, c.type, c.value, 0, OCI_ATTR_NONBLOCKING_MODE, err)), 0);
-        EXPECT_EQ(Attribute<ub1>(OCI_ATTR_NONBLOCKING_MODE, server, OCI_HTYPE_SERVER), c.mode);
-        EXPECT_EQ(Attribute<ub1>(OCI_ATTR_NONBLOCKING_MODE, svc, OCI_HTYPE_SVCCTX), c.mode);
-    }
-    auto* const bare = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    EXPECT_EQ(Answer(OCIAttrSet(bare, OCI_HTYPE_SVCCTX, nullptr, 0, OCI_ATTR_NONBLOCKING_MODE, err)), 3114);
 }
 
 // A memory function frees the define, or the whole statement, in the middle of the fetch that needs memory for it.

@@ -41,34 +41,6 @@ protected:
     }
 };
 
-// The cycle of a program that prints whole rows: one piece a column, the last fetch of a row answers 0.
-TEST_F(PieceByPiece, OneCycleARow) {
-    MustRun("create table t(id number, name varchar2(40))", "insert into t values(2, 'row 2'), (3, null)");
-    ASSERT_EQ(Query("select id, name from t order by id", {}, 0), 0);
-    OCIDefine* defines[2] = {};
-    for (ub4 column = 0; column < 2; ++column) ASSERT_EQ(Define(&defines[column], column + 1, InPieces(SQLT_STR)), 0);
-    const char* expected[2][2] = {{"2", "row 2"}, {"3", nullptr}};
-    for (const auto& row : expected) {
-        ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
-        for (ub4 column = 0; column < 2; ++column) {
-            Wanted wanted;
-            ASSERT_EQ(Get(wanted), 0);
-            EXPECT_EQ(wanted.handle, defines[column]);
-            EXPECT_EQ(wanted.type, ub4{OCI_HTYPE_DEFINE});
-            EXPECT_EQ(wanted.direction, OCI_PARAM_OUT);
-            sb2 indicator = 9;
-            ub2 code = 9;
-            sword rc = 0;
-            EXPECT_EQ(Piece(1000, rc, wanted.piece, &indicator, &code), row[column] ? row[column] : "");
-            EXPECT_EQ(rc, column == 0 ? OCI_NEED_DATA : OCI_SUCCESS);
-            EXPECT_EQ(indicator, row[column] ? 0 : -1);
-            EXPECT_EQ(code, row[column] ? 0 : 1405);
-        }
-        EXPECT_EQ(RowsFetched(), 1u);
-    }
-    EXPECT_EQ(FetchCode(), OCI_NO_DATA);
-}
-
 TEST_F(PieceByPiece, LongValueComesInSeveral) {
     Begin("select 'abcdefgh' from dual", {InPieces(SQLT_CHR)});
     std::string whole;
@@ -151,23 +123,6 @@ TEST_F(PieceByPiece, ExecuteAsksForEachValueOfEachRow) {
               "1:first and last:0102/2:-:03");
 }
 
-// A piece that was set for a bind that is made anew since is none of the next operation's; a name's bind is asked once.
-TEST_F(PieceByPiece, BindsMadeAnewAskAnew) {
-    MustRun("create table u(a varchar2(9), b varchar2(9), c varchar2(9))");
-    OCIBind *x = nullptr, *y = nullptr;
-    ASSERT_EQ(Prepare("insert into u values(:x, :y, :x)"), 0);
-    ub4 length = 1;
-    for (const char* data : {"pq", "ab"}) {
-        ASSERT_EQ(BindName(&x, "x", InPieces(SQLT_CHR)) + BindName(&y, "y", InPieces(SQLT_CHR)), 0);
-        for (int value = 0; value < 2; ++value) {
-            ASSERT_EQ(ExecuteCode(), OCI_NEED_DATA) << data[value];
-            ASSERT_EQ(Set(data + value, &length, OCI_ONE_PIECE), 0);
-        }
-    }
-    EXPECT_EQ(ExecuteCode(), OCI_SUCCESS);
-    EXPECT_EQ(One("select a || b || c from u"), "aba");
-}
-
 TEST_F(PieceByPiece, NothingIsWanted) {
     sb4 number = 0;
     ub4 length = 1;
@@ -246,55 +201,6 @@ TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
     EXPECT_STREQ(other, "x");
 }
 
-// Where SetPieceInfo gives no indicator or code, those of the define are told; the rest of the row follows.
-TEST_F(PieceByPiece, NullsAreToldThroughTheDefine) {
-    MustRun("create table t(id number, a varchar2(10), b varchar2(10))",
-            "insert into t values(1, null, 'one'), (2, 'a', null)");
-    sb2 a = 9, b = 9;
-    ub2 a_code = 9, b_code = 9;
-    ASSERT_EQ(Query("select a, b from t order by id",
-                    {InPieces(SQLT_CHR, &a, &a_code), InPieces(SQLT_CHR, &b, &b_code)}, 0), 0);
-    const struct { const char *a, *b; sb2 a_indicator, b_indicator; } rows[] = {{"", "one", -1, 0}, {"a", "", 0, -1}};
-    for (const auto& row : rows) {
-        ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
-        sword rc = 0;
-        EXPECT_EQ(Piece(10, rc), row.a);
-        EXPECT_EQ(rc, OCI_NEED_DATA) << "the rest of the row is not lost";
-        EXPECT_EQ(a, row.a_indicator);
-        EXPECT_EQ(a_code, row.a_indicator == 0 ? 0 : 1405);
-        EXPECT_EQ(Piece(10, rc), row.b);
-        EXPECT_EQ(rc, OCI_SUCCESS);
-        EXPECT_EQ(b, row.b_indicator);
-        EXPECT_EQ(b_code, row.b_indicator == 0 ? 0 : 1405);
-    }
-    Begin("select a, b from t order by id", {InPieces(SQLT_CHR)});
-    sword rc = 0;
-    EXPECT_EQ(Piece(10, rc), "");
-    EXPECT_EQ(Answer(rc), 1405) << "there is no indicator at all";
-}
-
-// Rows that an execute delivers go into the elements from its offset on, whether values come in pieces or not.
-TEST_F(PieceByPiece, AnExecuteDeliversFromItsOffset) {
-    ASSERT_EQ(Prepare("select 7, 'ab' from dual union all select 8, 'cd' from dual"), 0);
-    sb4 numbers[3] = {-1, -1, -1};
-    ASSERT_EQ(Define(1, {numbers, sizeof numbers[0], SQLT_INT}), 0);
-    ASSERT_EQ(Define(2, {nullptr, 10, SQLT_CHR}, OCI_DYNAMIC_FETCH), 0);
-    const auto execute = [&] { return OCIStmtExecute(svc, stmt, err, 3, 1, nullptr, nullptr, OCI_DEFAULT); };
-    EXPECT_EQ(execute(), OCI_NEED_DATA);
-    for (ub4 element = 1; element < 3; ++element) {
-        ub4 iteration = 0, length = 10;
-        char value[10];
-        ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, nullptr, nullptr, nullptr, &iteration, nullptr, nullptr)), 0);
-        EXPECT_EQ(iteration, element);
-        ASSERT_EQ(Set(value, &length, OCI_ONE_PIECE), 0);
-        EXPECT_EQ(execute(), element == 1 ? OCI_NEED_DATA : OCI_SUCCESS);
-        EXPECT_EQ(std::string(value, length), element == 1 ? "ab" : "cd");
-    }
-    EXPECT_EQ(numbers[0], -1);
-    EXPECT_EQ(numbers[1], 7);
-    EXPECT_EQ(numbers[2], 8);
-}
-
 // A buffer that takes no character is refused with 24307, and the value stays whole for the next.
 TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
     const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {
@@ -335,21 +241,6 @@ TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
     EXPECT_EQ(RowCount(), 2u);
     EXPECT_EQ(One("select group_concat(coalesce(a, '-') || ':' || hex(b), '/') from t"),
               "-:/ab:61620063");
-}
-
-// Of an execute in pieces that stops, the rows before are done and counted.
-TEST_F(PieceByPiece, ARowThatFails) {
-    MustRun("create table t(a varchar2(10) primary key)");
-    ASSERT_EQ(Ready("insert into t values(:1)", {InPieces(SQLT_CHR)}), 0);
-    ub4 length = 1;    // read by the execute that follows
-    for (int row = 0; row < 2; ++row) {
-        ASSERT_EQ(ExecuteCode(3), OCI_NEED_DATA);
-        ASSERT_EQ(Set("x", &length, OCI_ONE_PIECE), 0);
-    }
-    EXPECT_EQ(Execute(3), 1);
-    EXPECT_EQ(RowCount(), 1u);
-    EXPECT_EQ(FailedRow(), 1u);
-    EXPECT_EQ(One("select count(*) from t"), "1");
 }
 
 // What takes part in a waiting operation is freed: the operation is given up.
@@ -404,30 +295,6 @@ TEST_F(PieceByPiece, ADefineFreedBeforeItsTurn) {
     EXPECT_EQ(Piece(2, rc), "i");
     EXPECT_EQ(rc, OCI_SUCCESS);
     EXPECT_EQ(FetchCode(), OCI_NO_DATA);
-}
-
-// What the execute was asked for holds when the last piece of its rows is taken.
-TEST_F(PieceByPiece, AnExecuteThatDeliversThemLooksFurtherAndCommits) {
-    const struct { ub4 rows; sb4 answer; int kept; } cases[] = {{2, 0, 2}, {1, 1422, 1}};
-    for (const auto& c : cases) {
-        MustRun("create table t(id number, name varchar2(9))", "insert into t values(1, 'a')", "commit",
-                "insert into t values(2, 'b')");
-        ASSERT_EQ(Query("select name from t order by id", {InPieces(SQLT_CHR)}, 0), 0);
-        sword rc = ExecuteCode(c.rows, OCI_EXACT_FETCH | OCI_COMMIT_ON_SUCCESS);
-        for (ub4 row = 0; row < c.rows; ++row) {
-            ASSERT_EQ(rc, OCI_NEED_DATA) << c.rows;
-            char buffer[9];
-            ub4 length = sizeof buffer;
-            ASSERT_EQ(Set(buffer, &length, OCI_NEXT_PIECE), 0);
-            rc = ExecuteCode(c.rows, OCI_EXACT_FETCH | OCI_COMMIT_ON_SUCCESS);
-        }
-        EXPECT_EQ(Answer(rc), c.answer) << c.rows;
-        MustRun("rollback");
-        int kept = 0;
-        ASSERT_EQ(Query("select count(*) from t", {Int(kept)}), 0);
-        EXPECT_EQ(kept, c.kept) << c.rows;
-        MustRun("drop table t");
-    }
 }
 
 class Utf16Pieces : public PieceByPiece {
