@@ -102,17 +102,6 @@ TEST(NumberFunctions, AtRandomArguments) {
     for (int i = 0; i < 300; ++i) ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(numbers.Next(i % 4 == 0 ? 60 : 1)));
 }
 
-TEST(NumberFunctions, NextToMultiplesOfPi) {
-    for (const char* factor : {"0.25", "0.5", "1", "1.5", "2", "3", "22", "1000", "1E20", "123456789E30"}) {
-        OCINumber value;
-        number::SetPi(&value);
-        ASSERT_EQ(number::Mul(value, Number(factor), &value), 0);
-        ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(value));
-        ASSERT_EQ(number::Neg(value, &value), 0);
-        ASSERT_NO_FATAL_FAILURE(ExpectEverywhere(value));
-    }
-}
-
 // For each weight of the last digit the number of 39 digits that comes nearest: a numerator of the continued fraction of
 // pi/2 in such units.
 TEST(NumberFunctions, NearestToMultiplesOfHalfAPi) {

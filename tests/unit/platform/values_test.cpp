@@ -210,4 +210,23 @@ TEST(DecimalFloat, FromText) {
     }
 }
 
+TEST(PackedDecimal, DigitsOfTheBytes) {
+    const struct { std::string packed; std::size_t room; int result; bool negative; const char* digits; } cases[] = {
+        {"\x12\x34\x5D", 5, kDecimalDone, true, "12345"}, {"\x12\x34\x5B", 5, kDecimalDone, true, "12345"},
+        {"\x12\x34\x5C", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5A", 5, kDecimalDone, false, "12345"},
+        {"\x12\x34\x5E", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5F", 5, kDecimalDone, false, "12345"},
+        {"\x00\x00\x7C"s, 1, kDecimalDone, false, "7"}, {"\x00\x0D"s, 1, kDecimalDone, true, ""},
+        {"\x12\x34\x5C", 4, kDecimalTooShort, false, "1234"}, {"\x12\x34\x59", 5, kDecimalBadSign, false, ""},
+        {"\x1A\x34\x5C", 5, kDecimalBadDigit, false, "1"}};
+    for (const auto& c : cases) {
+        char digits[16] = {};
+        bool negative = false;
+        std::size_t count = 99;
+        EXPECT_EQ(ReadPackedDecimal(c.packed.data(), c.packed.size(), &negative, digits, c.room, &count), c.result)
+            << Hex(c.packed.data(), c.packed.size());
+        EXPECT_EQ(std::string(digits, count), c.digits) << Hex(c.packed.data(), c.packed.size());
+        EXPECT_EQ(negative, c.negative) << Hex(c.packed.data(), c.packed.size());
+    }
+}
+
 }  // namespace

@@ -173,6 +173,22 @@ TEST_F(ThreadCalls, ManyThreadsAtOnce) {
     EXPECT_EQ(destroyed, kThreads);
 }
 
+TEST_F(ThreadCalls, BadArguments) {
+    OCIThreadKey* key = NewKey();
+    OCIThreadId* id = NewId();
+    boolean flag = 0;
+    const sb4 nulls[] = {
+        Answer(OCIThreadMutexInit(env_, err_, nullptr)), Answer(OCIThreadMutexDestroy(env_, err_, nullptr)),
+        Answer(OCIThreadMutexAcquire(env_, err_, nullptr)), Answer(OCIThreadKeyInit(env_, err_, nullptr, nullptr)),
+        Answer(OCIThreadKeyGet(env_, err_, key, nullptr)), Answer(OCIThreadKeySet(env_, err_, nullptr, nullptr)),
+        Answer(OCIThreadIdInit(env_, err_, nullptr)), Answer(OCIThreadIdSet(env_, err_, id, nullptr)),
+        Answer(OCIThreadIdSame(env_, err_, nullptr, id, &flag)), Answer(OCIThreadIdSame(env_, err_, id, id, nullptr)),
+        Answer(OCIThreadIdNull(env_, err_, id, nullptr)), Answer(OCIThreadIdGet(env_, err_, nullptr)),
+        Answer(OCIThreadHndInit(env_, err_, nullptr)), Answer(OCIThreadJoin(env_, err_, nullptr)),
+        Answer(OCIThreadClose(env_, err_, nullptr)), Answer(OCIThreadHandleGet(env_, err_, nullptr))};
+    for (const sb4& answer : nulls) EXPECT_EQ(answer, 21560) << &answer - nulls;
+}
+
 TEST_F(ThreadCalls, NothingWorksOutsideOfThePackage) {
     ASSERT_EQ(OCIThreadTerm(env_, err_), OCI_SUCCESS);
     OCIThreadMutex* mutex = nullptr;

@@ -140,29 +140,6 @@ TEST_F(Cache, Off) {
     EXPECT_EQ(Answer(OCIStmtRelease(stmt, err, nullptr, 0, OCI_DEFAULT)), 24434);
 }
 
-TEST_F(Cache, ByTextAndByKey) {
-    TurnOn(2);
-    const char* const sql = "select 1 from dual";
-    ASSERT_EQ(Prepare2(sql), 0);
-    OCIStmt* const plain = statement;
-    OCIStmt* const other = New<OCIStmt>(OCI_HTYPE_STMT);
-    ASSERT_EQ(Release(), 0);
-    EXPECT_EQ(OCIHandleFree(plain, OCI_HTYPE_STMT), OCI_INVALID_HANDLE) << "a kept statement is no handle";
-    ASSERT_EQ(Prepare2(sql), 0);
-    EXPECT_EQ(statement, plain);
-    ASSERT_EQ(Release("tag"), 0);
-    EXPECT_EQ(Kept(sql), 24431) << "it has a key now";
-    EXPECT_EQ(Prepare2("", "gat"), 24431);
-    ASSERT_EQ(Prepare2("", "tag"), 0) << "the key alone finds it";
-    EXPECT_EQ(statement, plain);
-    ASSERT_EQ(Release(), 0);
-    EXPECT_EQ(Prepare2(sql, "tag"), 24432) << "found by its text";
-    EXPECT_EQ(statement, plain);
-    ASSERT_EQ(Release("", OCI_STRLS_CACHE_DELETE), 0);
-    EXPECT_EQ(Kept(sql), 24431);
-    EXPECT_EQ(OCIHandleFree(other, OCI_HTYPE_STMT), OCI_SUCCESS);
-}
-
 TEST_F(Cache, KeepsBindsAndLosesTheOldest) {
     TurnOn(2);
     sb4 in = 7, out = 0;

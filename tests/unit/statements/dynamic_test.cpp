@@ -211,49 +211,6 @@ TEST_F(Dynamic, BlocksAndTables) {
     EXPECT_EQ(One("select group_concat(a, ',') from t"), "abcabc,p,q,xx,r,s");
 }
 
-// Binds without callbacks are polled in their turn, in either direction.
-TEST_F(Dynamic, PollingBesideCallbacks) {
-    MustRun("create table t(a varchar2(40), b varchar2(40))");
-    Giver giver({"=a0", "=a1"});
-    Taker taker(9);
-    ASSERT_EQ(Prepare("insert into t values(:1, :2) returning a, b into :3, :4"), 0);
-    ASSERT_EQ(BindTo(1, &giver, nullptr), 0);
-    ASSERT_EQ(BindTo(2, nullptr, nullptr), 0);
-    ASSERT_EQ(Bind(&binds_[3], 3, InPieces(SQLT_CHR)), 0);
-    OCIBind* last = nullptr;
-    ASSERT_EQ(Bind(&last, 4, InPieces(SQLT_CHR)), 0);
-    ASSERT_EQ(Answer(OCIBindDynamic(last, err, nullptr, nullptr, &taker, Callback::Out)), 0);
-    ub4 length = 0;
-    char buffer[3] = "";
-    for (ub4 row = 0; row < 2; ++row) {
-        for (const ub1 direction : {OCI_PARAM_IN, OCI_PARAM_OUT}) {
-            const bool waits = row == 1 && direction == OCI_PARAM_IN;
-            EXPECT_EQ(waits ? OCI_NEED_DATA : ExecuteCode(2), OCI_NEED_DATA);
-            dvoid* handle = nullptr;
-            ub4 iteration = 9, index = 9;
-            ub1 in_out = 0;
-            length = 2;
-            std::strcpy(buffer, "b0");
-            ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, nullptr, &in_out, &iteration, &index, nullptr)), 0);
-            EXPECT_EQ(handle, binds_[direction == OCI_PARAM_IN ? 2 : 3]);
-            EXPECT_EQ(in_out, direction);
-            EXPECT_EQ(iteration * 10 + index, row * 10);
-            const auto set = [&](ub1 piece) {
-                return Answer(OCIStmtSetPieceInfo(handle, OCI_HTYPE_BIND, err, buffer, &length, piece, nullptr, nullptr));
-            };
-            if (direction == OCI_PARAM_IN) {
-                EXPECT_EQ(set(OCI_NEXT_PIECE), 24370);
-                EXPECT_EQ(set(OCI_LAST_PIECE), 24370);
-            }
-            ASSERT_EQ(set(OCI_ONE_PIECE), 0);
-            if (direction == OCI_PARAM_IN) continue;
-            EXPECT_EQ(ExecuteCode(2), row == 0 ? OCI_NEED_DATA : OCI_SUCCESS);
-            EXPECT_EQ(string(buffer, length), row == 0 ? "a0" : "a1");
-        }
-    }
-    EXPECT_EQ(taker.Flush(), "b0|b0|");
-}
-
 // A name that stands twice is asked for once; iterations count from the row offset.
 TEST_F(Dynamic, RepeatedNamesAndRowOffset) {
     MustRun("create table t(a varchar2(40), b varchar2(40), c varchar2(40))");
@@ -308,30 +265,6 @@ TEST_F(Dynamic, AnswersThatAreRefused) {
         ASSERT_EQ(BindTo(1, nullptr, &callback), 0);
         EXPECT_EQ(Execute(), c.out);
     }
-}
-
-TEST_F(Dynamic, CallbacksThatAreMissing) {
-    MustRun("create table t(a varchar2(40))");
-    Giver giver({"=x"});
-    Taker taker(9);
-    char area[9] = "x";
-    ASSERT_EQ(Prepare("insert into t values(:1) returning a into :2"), 0);
-    ASSERT_EQ(Bind(&binds_[1], 1, Text(area)), 0);
-    EXPECT_EQ(Answer(OCIBindDynamic(binds_[1], err, nullptr, Callback::In, nullptr, nullptr)), 24305);
-    EXPECT_EQ(OCIBindDynamic(nullptr, err, nullptr, Callback::In, nullptr, nullptr), OCI_INVALID_HANDLE);
-    ASSERT_EQ(BindTo(1, nullptr, &taker), 0);
-    EXPECT_EQ(Execute(), 24369);
-    ASSERT_EQ(BindTo(1, &giver, nullptr), 0);
-    ASSERT_EQ(BindTo(2, &giver, nullptr), 0);
-    EXPECT_EQ(Execute(), 24369);
-    EXPECT_EQ(giver.asked, "");
-    ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR)), 0);    // anew: nothing is registered any more
-    ASSERT_EQ(BindTo(2, nullptr, &taker), 0);
-    EXPECT_EQ(ExecuteCode(), OCI_NEED_DATA);
-    OCIDefine* define = nullptr;
-    ASSERT_EQ(Define(&define, 1, Text(area)), 0);
-    EXPECT_EQ(Answer(OCIDefineDynamic(define, err, nullptr, Callback::Define)), 24305);
-    EXPECT_EQ(OCIDefineDynamic(define, nullptr, nullptr, Callback::Define), OCI_INVALID_HANDLE);
 }
 
 // What callbacks do to what calls them. The statement itself is closed; the rest of the session is not.

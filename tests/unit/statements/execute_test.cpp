@@ -57,22 +57,6 @@ TEST_F(Executing, SyntaxErrorsPointIntoTheText) {
     EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
 }
 
-TEST_F(Executing, TheMomentInDefaultsAndLists) {
-    MustRun("create table t(a number, d date default sysdate, s timestamp default systimestamp)",
-            "insert into t(a) values(1)");
-    EXPECT_EQ(One("select count(*) from t where d <= sysdate and s is not null"), "1");
-    EXPECT_EQ(One("select nvl(null, nvl2(a, 'there', 'null')) from t"), "there");
-    ASSERT_EQ(Query("select sysdate, systimestamp from dual", {}, 0, OCI_DESCRIBE_ONLY), 0);
-    const struct { ub4 position; const char* name; ub2 type; } columns[] = {
-        {1, "SYSDATE", SQLT_DAT}, {2, "SYSTIMESTAMP", SQLT_TIMESTAMP_TZ}};
-    for (const auto& c : columns) {
-        dvoid* const column = Column(c.position);
-        EXPECT_EQ(ColumnName(column), c.name);
-        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_DATA_TYPE, column, OCI_DTYPE_PARAM), c.type) << c.name;
-        OCIDescriptorFree(column, OCI_DTYPE_PARAM);
-    }
-}
-
 TEST_F(Executing, TruncateEmptiesTheTableForGood) {
     MustRun("create table t(a number)", "insert into t values(1)");
     ASSERT_EQ(Prepare("truncate table t"), 0);
@@ -141,32 +125,6 @@ TEST_F(Executing, ValueThatCannotBeReadFailsItsRow) {
     ASSERT_EQ(Ready("insert into t values(:1)", {Text(areas)}), 0);
     EXPECT_EQ(Execute(3), 1480) << "no terminator in the second area";
     EXPECT_EQ(Rows(), "1");
-}
-
-// The session counts the results that are open.
-TEST_F(Executing, OpenStatementsAreCounted) {
-    OCISession* session = nullptr;
-    ASSERT_EQ(Answer(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err)), 0);
-    const auto open = [&] { return Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION); };
-    OCIStmt* statements[3];
-    for (ub4 index = 0; index < 3; ++index) {
-        stmt = statements[index] = New<OCIStmt>(OCI_HTYPE_STMT);
-        ASSERT_EQ(Query("select 1 from dual", {}, 0), 0);
-        EXPECT_EQ(open(), index + 1);
-        ASSERT_EQ(Execute(0), 0) << "again: the former result is closed";
-        EXPECT_EQ(open(), index + 1);
-    }
-    EXPECT_EQ(Fetch(0), 0);
-    EXPECT_EQ(open(), 2u);
-    stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-    ASSERT_EQ(Ready("begin open :c for select 1 from dual; end;", {{&statements[1], 8, SQLT_RSET}}), 0);
-    ASSERT_EQ(Execute(), 0);
-    EXPECT_EQ(open(), 2u) << "one result took the place of another";
-    OCIHandleFree(statements[1], OCI_HTYPE_STMT);
-    EXPECT_EQ(open(), 1u);
-    stmt = statements[0];
-    ASSERT_EQ(Prepare("select 2 from dual"), 0);
-    EXPECT_EQ(open(), 0u);
 }
 
 // What was compiled and opened on one session is left behind when the statement is executed on another.

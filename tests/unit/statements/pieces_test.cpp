@@ -201,6 +201,13 @@ TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
     EXPECT_STREQ(other, "x");
 }
 
+TEST_F(PieceByPiece, ANullWithoutAnyIndicator) {
+    Begin("select null from dual", {InPieces(SQLT_CHR)});
+    sword rc = 0;
+    EXPECT_EQ(Piece(10, rc), "");
+    EXPECT_EQ(Answer(rc), 1405);
+}
+
 // A buffer that takes no character is refused with 24307, and the value stays whole for the next.
 TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
     const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {

@@ -378,20 +378,6 @@ TEST_F(Conversions, SizesThatATypeCannotHave) {
     }
 }
 
-// Columns of large objects read and write as text and bytes.
-TEST_F(Conversions, LargeObjectsAsTextAndBytes) {
-    MustRun("create table l(c clob, b blob)");
-    std::string text(100000, 'x');
-    text += "end";
-    const auto size = static_cast<sb4>(text.size());
-    ASSERT_EQ(Ready("insert into l values(:1, :2)", {{text.data(), size, SQLT_CHR}, {text.data(), size, SQLT_LBI}}), 0);
-    ASSERT_EQ(Execute(), 0);
-    std::string out[2] = {std::string(text.size() + 1, '#'), std::string(text.size(), '#')};
-    ASSERT_EQ(Query("select c, b from l", {{out[0].data(), size + 1, SQLT_STR}, {out[1].data(), size, SQLT_BIN}}), 0);
-    EXPECT_STREQ(out[0].c_str(), text.c_str());
-    EXPECT_EQ(out[1], text);
-}
-
 class Utf16Conversions : public Conversions {
 protected:
     Utf16Conversions() : Conversions(OCI_UTF16) {}
