@@ -228,6 +228,7 @@ protected:
     [[nodiscard]] StatementCalls Another() const {
         return {env, New<OCIError>(OCI_HTYPE_ERROR), svc, New<OCIStmt>(OCI_HTYPE_STMT), mode_, database_};
     }
+    [[nodiscard]] bool OnServer() const { return server_ != nullptr; }    // what is the embedded engine's alone is asked there
 
 private:
     std::unique_ptr<PostgresDatabase> server_;
