@@ -15,7 +15,13 @@ static const AnyFunction kFunctions[] = {
     F(OCIDateTimeIntervalSub), F(OCIDateTimeSysTimeStamp), F(OCIIntervalSetDaySecond), F(OCIIntervalSetYearMonth),
     F(OCIIntervalGetDaySecond), F(OCIIntervalGetYearMonth), F(OCIIntervalFromText), F(OCIIntervalToText),
     F(OCIIntervalAdd), F(OCIIntervalSubtract), F(OCIIntervalCompare), F(OCIIntervalAssign), F(OCIDescribeAny),
-    F(OCIAttrSet), F(OCIDateTimeConstruct), F(OCIServerVersion)};
+    F(OCIAttrSet), F(OCIDateTimeConstruct), F(OCIServerVersion), F(OCIBindByName2), F(OCIBindByPos2), F(OCIDefineByPos2),
+    F(OCILobRead2), F(OCILobWrite2), F(OCILobWriteAppend2), F(OCILobGetLength2), F(OCILobTrim2), F(OCILobErase2),
+    F(OCILobCopy2), F(OCILobWriteAppend), F(OCILobCharSetForm), F(OCILobCharSetId), F(OCILobGetChunkSize), F(OCILobRead),
+    F(OCILobWrite), F(OCILobGetLength), F(OCILobTrim), F(OCILobErase), F(OCILobCopy), F(OCILobAppend), F(OCILobAssign),
+    F(OCILobLocatorAssign), F(OCILobIsEqual), F(OCILobIsOpen), F(OCILobIsTemporary), F(OCILobLocatorIsInit), F(OCILobOpen),
+    F(OCILobClose), F(OCILobCreateTemporary), F(OCILobFreeTemporary), F(OCILobEnableBuffering), F(OCILobDisableBuffering),
+    F(OCILobFlushBuffer), F(OCIStmtGetNextResult), F(OCITransStart), F(OCITransCommit), F(OCITransRollback)};
 
 static const unsigned long long kConstants[] = {
     SQLCS_NCHAR, SQLCS_IMPLICIT, SQLT_INTERVAL_YM, SQLT_INTERVAL_DS, OCI_DTYPE_INTERVAL_YM, OCI_DTYPE_INTERVAL_DS,
@@ -23,7 +29,8 @@ static const unsigned long long kConstants[] = {
     OCI_TYPECODE_BFLOAT, UB4MAXVAL, SB4MAXVAL, UB2MAXVAL, SB2MAXVAL, UB1MAXVAL, SB1MAXVAL, OCI_FO_END, OCI_FO_ABORT,
     OCI_FO_REAUTH, OCI_FO_BEGIN, OCI_FO_ERROR, OCI_FO_RETRY, OCI_FO_NONE, OCI_FO_SESSION, OCI_FO_SELECT, OCI_FO_TXNAL,
     OCI_ATTR_CHARSET_FORM, OCI_ATTR_CHARSET_ID, OCI_ATTR_NONBLOCKING_MODE, OCI_ATTR_PREFETCH_ROWS,
-    OCI_ATTR_PREFETCH_MEMORY, OCI_ATTR_FOCBK, OCI_DESCRIBE_ONLY, OCI_PREP2_CACHE_SEARCHONLY};
+    OCI_ATTR_PREFETCH_MEMORY, OCI_ATTR_FOCBK, OCI_DESCRIBE_ONLY, OCI_PREP2_CACHE_SEARCHONLY, SQLT_AFV, OCI_ATTR_MODULE,
+    OCI_ATTR_ACTION, OCI_ATTR_CLIENT_IDENTIFIER, OCI_ATTR_STMTCACHESIZE, OCI_ATTR_CURRENT_SCHEMA};
 
 static sb4 Failover(dvoid *svc, dvoid *env, dvoid *ctx, ub4 type, ub4 event) {
     return svc || env || ctx || type == event ? OCI_CONTINUE : OCI_CONTINUE;
