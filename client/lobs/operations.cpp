@@ -55,6 +55,11 @@ auto FindOpened(const LargeObject& object, values::LobSession& session) {
                         [&](const auto& opened) { return opened.lob->IsSame(object.Lob()); });
 }
 
+void NoteWaiting(const LargeObject& object, bool waits) {
+    for (auto& entry : object.Located().session->buffered)
+        if (entry.by.lock() == object.Located().kept) entry.waits = waits;
+}
+
 }  // namespace
 
 Status Find(LobDescriptor& descriptor, Link& link, LargeObject& object) {
@@ -126,6 +131,10 @@ bool IsOpen(const LargeObject& object, const Link& link) {
 }
 
 Status CheckOpenForWriting(const LargeObject& object, const Link& link) {
+    for (const auto& entry : link.lobs->buffered) {
+        if (entry.waits && entry.lob->IsSame(object.Lob()) && entry.by.lock() != object.Located().kept)
+            return Error(errors::kTwoLocatorsModify);
+    }
     const auto found = FindOpened(object, *link.lobs);
     return found == link.lobs->opened.end() || found->writes ? Status() : Error(errors::kLobReadOnly);
 }
@@ -162,6 +171,10 @@ Status Assign(LobDescriptor& to, const LobDescriptor& from) {
     values::Located located = from.Get();
     if (!located.lob) return Error(errors::kInvalidLocator);
     if (&to == &from) return {};
+    if (located.session) {
+        const SerialLock lock(located.session->serial);
+        if (located.session->Waits(located.kept)) return Error(errors::kUpdatedLocator);
+    }
     located.kept = nullptr;
     if (located.lob->IsTemporary()) {
         const SerialLock lock(located.session->serial);
@@ -181,7 +194,7 @@ Status EnableBuffering(LargeObject& object, Link& link) {
     std::erase_if(buffered, [](const auto& entry) { return entry.by.expired(); });
     for (const auto& entry : buffered)
         if (entry.lob->IsSame(object.Lob())) return Error(errors::kTwoLocatorsModify);
-    buffered.push_back({object.Located().lob, object.Located().kept});
+    buffered.push_back({object.Located().lob, object.Located().kept, false});
     object.State().buffer.emplace();
     return {};
 }
@@ -211,6 +224,7 @@ Status Flush(LargeObject& object) {
     if (status.Failed()) return status;
     buffer->units = 0;
     buffer->data.clear();
+    NoteWaiting(object, false);
     return {};
 }
 
@@ -228,6 +242,7 @@ Status WriteIntoBuffer(LargeObject& object, std::uint64_t at, std::string_view d
     if (buffer.data.size() + data.size() > kBufferRoom) return Error(errors::kNoBufferLeft);
     buffer.data.append(data);
     buffer.units += units;
+    NoteWaiting(object, true);
     return {};
 }
 

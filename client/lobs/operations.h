@@ -23,7 +23,8 @@ Status LoadFromFile();
 Status Open(LargeObject& object, Link& link, std::uint8_t mode);
 Status Close(LargeObject& object, Link& link);
 bool IsOpen(const LargeObject& object, const Link& link);
-Status CheckOpenForWriting(const LargeObject& object, const Link& link);    // 22294
+// 22294, and 22277 where what was written through another locator's buffer waits.
+Status CheckOpenForWriting(const LargeObject& object, const Link& link);
 
 struct TemporaryArguments {
     std::uint16_t character_set;

@@ -4,6 +4,7 @@
 // Threads: Get and Set from any thread; what hangs on the object is used under the lock of its session.
 #pragma once
 
+#include <algorithm>
 #include <memory>
 #include <mutex>
 #include <utility>
@@ -26,8 +27,15 @@ struct LobSession {
     struct Buffered {
         std::shared_ptr<engine::Lob> lob;
         std::weak_ptr<void> by;           // what is kept with the locator
+        bool waits = false;               // what was written through it
     };
     std::vector<Buffered> buffered;
+    // Of a locator, by what is kept with it: what was written through it is not the object's yet.
+    [[nodiscard]] bool Waits(const std::shared_ptr<void>& kept) const {
+        return kept && std::any_of(buffered.begin(), buffered.end(), [&](const Buffered& entry) {
+            return entry.waits && entry.by.lock() == kept;
+        });
+    }
     std::shared_ptr<std::recursive_mutex> serial;    // null in environments without threads
     std::shared_ptr<void> stream;         // a read or write that goes on with its next call; of the lobs room
 };

@@ -102,6 +102,7 @@ int ReadLocator(const Located& located, Workspace& workspace, Datum& value) {
     const LobSession* const session = workspace.lobs.get();
     if (!located.lob) return errors::kInvalidLocator;
     if (located.session && !located.IsOf(session)) return errors::kForeignLocator;
+    if (session && session->Waits(located.kept)) return errors::kUpdatedLocator;
     std::uint64_t length = 0;
     if (session && session->store && session->store->TakesObjects()) {
         if (Status status = located.lob->Length(length); !status.Ok()) return status.Number();

@@ -220,7 +220,14 @@ TEST_F(Lobs, BufferedWritesWait) {
     EXPECT_EQ(Write(lob, 1, "H"), 0);
     EXPECT_EQ(Write(lob, 2, "A"), 0);
     EXPECT_EQ(Read(other, 2), "2:h\xC3\xA4");
-    EXPECT_EQ(Read(lob, 3), "3:HAl");
+    EXPECT_EQ(Write(other, 1, "x"), 22277);                    // while what is written waits
+    EXPECT_EQ(Answer(OCILobTrim(svc, err, other, 1)), 22277);
+    OCILobLocator* third = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    EXPECT_EQ(Answer(OCILobAssign(env, err, lob, &third)), 22281);
+    ASSERT_EQ(Ready("insert into l(c) values(:1)", {Locator(lob)}), 0);
+    EXPECT_EQ(Execute(), 22281);
+    EXPECT_EQ(Read(lob, 3), "3:HAl");                          // which has it written
+    EXPECT_EQ(Answer(OCILobAssign(env, err, lob, &third)), 0);
     ub4 amount = 0;
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &amount)), 22279);
     EXPECT_EQ(Read(lob, 10, 1, 4), "!24808");
