@@ -49,6 +49,9 @@ TEST_F(DateCalls, ResultsAreWrittenOnSuccessOnly) {
     EXPECT_EQ(day.OCIDateYYYY, 2025);
     EXPECT_EQ(day.OCIDateDD, 28);
     EXPECT_EQ(day.OCIDateTime.OCITimeSS, 3);
+    sword order = 0;
+    EXPECT_EQ(Answer(OCIDateCompare(err_, nullptr, &day, &order)), 21560);
+    EXPECT_EQ(Answer(OCIDateNextDay(err_, nullptr, Text("SUN"), 3, &day)), 21560);
     const OCIDate bad = Date(2023, 2, 29);
     EXPECT_EQ(Answer(OCIDateLastDay(err_, &bad, &day)), 1839);
     EXPECT_EQ(Answer(OCIDateAddDays(err_, &day, 2147483647, &day)), 1841);

@@ -460,6 +460,7 @@ TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
         {"to_char(months_between(date '2024-03-30', date '2024-02-29'), '9.999999')", " 1.032258"},
         {"initcap('1st 2ND o''neil')", "1st 2nd O'Neil"},
         {"instr('abc', 'a', -3)", "1"}, {"instr('abc', 'a', -4)", "0"}, {"instr('abc', 'c', 3)", "3"},
+        {"nvl2(1, 'there', 'null')", "there"}, {"nvl2(null, 'there', 'null')", "null"},
         {"instr('abc', 'c', 4)", "0"}, {"'[' || decode(cast('   ' as char(3)), '   ', 'same') || ']'", "[same]"},
     };
     for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.value) << c.expression;

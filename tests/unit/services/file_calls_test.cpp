@@ -139,6 +139,8 @@ TEST_F(FileCalls, ReadingAndWritingTakeTurns) {
     EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 0);
     EXPECT_EQ(Read(reader, 100), "h") << "what is added behind the end can be read on";
     EXPECT_EQ(Write(reader, "x"), 30157);
+    ub4 count = 0;
+    EXPECT_EQ(Answer(OCIFileRead(env_, err_, reader, &count, kHuge, &count)), 30150);
     EXPECT_EQ(Read(MustOpen("both", OCI_FILE_WRITE_ONLY, OCI_FILE_EXIST), 1), "30157");
 }
 

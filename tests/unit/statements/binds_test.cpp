@@ -142,6 +142,9 @@ TEST_F(Cache, Off) {
 
 TEST_F(Cache, KeepsBindsAndLosesTheOldest) {
     TurnOn(2);
+    ASSERT_EQ(Prepare2("select 1 from dual") + Release(), 0);
+    EXPECT_EQ(Prepare2("select 1 from dual", "tag"), 24432) << "found by its text";
+    ASSERT_EQ(Release("", OCI_STRLS_CACHE_DELETE), 0);
     sb4 in = 7, out = 0;
     OCIStmt* const outer = stmt;
     ASSERT_EQ(Prepare2("select :a from dual"), 0);
