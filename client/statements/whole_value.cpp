@@ -78,12 +78,6 @@ bool OutgoingValue::Streams(const DataArea& area, engine::LobKind kind) {
     return IsText(area) || kind == engine::LobKind::bytes;
 }
 
-void OutgoingValue::Start(std::string_view whole) {
-    rest = whole;
-    whole_ = whole.size();
-    object_ = nullptr;
-}
-
 void OutgoingValue::Start(std::shared_ptr<engine::Lob> object) {
     rest = {};
     whole_ = engine::kHeldWhole;
@@ -92,8 +86,7 @@ void OutgoingValue::Start(std::shared_ptr<engine::Lob> object) {
     read_ = 0;
 }
 
-int OutgoingValue::Refill(DataArea& area) {
-    if (!rest.empty() || !object_) return 0;
+int OutgoingValue::ReadMore(DataArea& area) {
     if (object_->Version() != version_) return errors::kSnapshotTooOld;    // old and new bytes are no value
     const bool has_characters = object_->Kind() == engine::LobKind::characters;
     std::uint64_t length = 0;

@@ -45,16 +45,22 @@ public:
     // Whether a define or bind takes pieces of a large object as they are read. Others get the value whole.
     static bool Streams(const DataArea& area, engine::LobKind kind);
 
-    void Start(std::string_view whole);
+    void Start(std::string_view whole) {
+        rest = whole;
+        whole_ = whole.size();
+        object_ = nullptr;
+    }
     void Start(std::shared_ptr<engine::Lob> object);    // one of those that stream
     // Has more at hand when nothing is, unless the value ends. Answers an error's number or 0.
-    int Refill(DataArea& area);
+    int Refill(DataArea& area) { return rest.empty() && object_ ? ReadMore(area) : 0; }
 
     [[nodiscard]] bool Ends() const { return rest.empty() && !object_; }
     [[nodiscard]] std::int16_t CutIndicator() const;    // for one of which not all is taken
     std::string_view rest;    // in the application's form, at hand: views what was given, or the area's workspace
 
 private:
+    int ReadMore(DataArea& area);
+
     std::size_t whole_ = 0;                 // bytes; of an object, more than an indicator tells
     std::shared_ptr<engine::Lob> object_;    // until it is read to its end
     std::uint64_t read_ = 0;
