@@ -20,6 +20,7 @@ using namespace std::chrono_literals;
 using Clock = std::chrono::steady_clock;
 
 constexpr auto kBetweenCancels = 200ms;
+constexpr std::int64_t kLong = std::int64_t{16} << 20;    // bytes
 constexpr int kNoticeNumber = 20000;    // what the server, or code in it, tells in its own words
 constexpr auto kForever = Clock::time_point::max();
 
@@ -144,6 +145,15 @@ void Wire::SendQuery(const char* sql, const Values& values, bool binary_results)
     if (broken_ || short_of_memory_) return;
     Sent(PQsendQueryParams(connection_, sql, static_cast<int>(values.data.size()), nullptr, values.data.data(),
                            values.lengths.data(), values.formats.data(), binary_results));
+    SendLong(values);
+}
+
+// What libpq cannot send at once it moves to the front of its buffer, each time: of long values it sends all at once.
+void Wire::SendLong(const Values& values) noexcept {
+    std::int64_t bytes = 0;
+    for (std::size_t index = 0; index < values.data.size(); ++index) bytes += values.data[index] ? values.lengths[index] : 0;
+    if (bytes <= kLong || broken_ || short_of_memory_) return;
+    broken_ = PQsetnonblocking(connection_, 0) != 0 || PQsetnonblocking(connection_, 1) != 0;
 }
 
 void Wire::SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept {
@@ -160,6 +170,7 @@ void Wire::SendExecute(const char* name, const Values& values, bool binary_resul
     if (broken_ || short_of_memory_) return;
     Sent(PQsendQueryPrepared(connection_, name, static_cast<int>(values.data.size()), values.data.data(),
                              values.lengths.data(), values.formats.data(), binary_results));
+    SendLong(values);
 }
 
 // Without its end a batch cannot be read: the connection is of no use then.

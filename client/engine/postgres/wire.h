@@ -118,6 +118,7 @@ private:
     Status Settle() noexcept;
     bool Wait() noexcept;
     void Sent(int answer) noexcept;
+    void SendLong(const Values& values) noexcept;
     static void OnNotice(void* self, const PGresult* result) noexcept;
 
     PGconn* connection_ = nullptr;
