@@ -234,6 +234,11 @@ public:
     virtual Status CommitPrepared(const Xid& xid) = 0;      // 24756 when there is none of that name
     virtual Status RollbackPrepared(const Xid& xid) = 0;
     virtual Status Recover(std::vector<Xid>& prepared) = 0;
+    // Whether the server keeps a prepared branch of the name, whoever prepared it: no other can be prepared beside it.
+    virtual Status KeepsPrepared(const Xid&, bool& kept) {
+        kept = false;
+        return {};
+    }
 
     // Of engines that cannot: makes sure of what a commit would check at its end, so that it then succeeds, and sets
     // `changed` when there is anything to commit. A failure has rolled the transaction back, unless InTransaction holds.

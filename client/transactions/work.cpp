@@ -122,8 +122,12 @@ Status WorkingBranch::Check(bool in_transaction) {
 Status Begin(Link& link, const NewBranch& branch, Family family) {
     auto working = std::make_unique<WorkingBranch>(nullptr, family);
     BranchPointer held;
-    Status status = Branches::Process().Create({IdentityOf(link.Database()), branch.xid}, link.user, branch.coupling,
-                                               branch.timeout, held);
+    bool kept = false;
+    Status status = link.Engine().KeepsPrepared(branch.xid, kept);
+    if (!status.Ok()) return status;
+    if (kept) return Error(errors::kDuplicateXid);
+    status = Branches::Process().Create({IdentityOf(link.Database()), branch.xid}, link.user, branch.coupling, branch.timeout,
+                                        held);
     if (!status.Ok()) return status;
     working->Set(held);
     if (branch.mode != engine::TransactionMode::read_write && !held->work->connection) {

@@ -56,6 +56,7 @@ public:
     Status CommitPrepared(const Xid& xid) override;
     Status RollbackPrepared(const Xid& xid) override;
     Status Recover(std::vector<Xid>& prepared) override;
+    Status KeepsPrepared(const Xid& xid, bool& kept) override;
     Status Another(std::shared_ptr<const StopRequest> stop, std::unique_ptr<Connection>& connection) override;
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept override { wire_->Obey(std::move(stop)); }
     Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) override;

@@ -115,4 +115,14 @@ Status PgConnection::Recover(std::vector<Xid>& prepared) {
     return status;
 }
 
+// Names are the cluster's, not the database's. The function behind the view joins nothing to them.
+Status PgConnection::KeepsPrepared(const Xid& xid, bool& kept) {
+    kept = false;
+    if (!home_->TwoPhase()) return {};
+    Result found;
+    Status status = Ask("select 1 from pg_catalog.pg_prepared_xact() where gid = $1", {NameOf(xid)}, found);
+    kept = status.Ok() && PQntuples(found.get()) > 0;
+    return status;
+}
+
 }  // namespace engine::postgres
