@@ -1,9 +1,13 @@
 // Codes for numbers, numbers for codes, and the diagnostics of each thread.
 #include "xa/answer.h"
 
+#include <pthread.h>
+
 #include <algorithm>
 #include <cstring>
 #include <map>
+#include <memory>
+#include <new>
 
 #include "handles/error_handle.h"
 #include "handles/errors.h"
@@ -86,9 +90,28 @@ SQLCA Diagnose(const Answer& answer) {
     return area;
 }
 
-std::map<int, SQLCA>& OfThisThread() {
-    static thread_local std::map<int, SQLCA> diagnostics;
-    return diagnostics;
+// The system's thread-specific data: for a variable of the language's without memory the process would end.
+using Diagnostics = std::map<int, SQLCA>;
+struct ThreadKey {
+    pthread_key_t key{};
+    const bool made = pthread_key_create(&key, [](void* own) { delete static_cast<Diagnostics*>(own); }) == 0;
+};
+const ThreadKey& KeyOfThreads() {
+    static const ThreadKey key;
+    return key;
+}
+
+// Null when the thread has none.
+Diagnostics* OfThisThread() {
+    const ThreadKey& key = KeyOfThreads();
+    return key.made ? static_cast<Diagnostics*>(pthread_getspecific(key.key)) : nullptr;
+}
+
+Diagnostics& MadeForThisThread() {
+    if (Diagnostics* const own = OfThisThread()) return *own;
+    auto made = std::make_unique<Diagnostics>();
+    if (!KeyOfThreads().made || pthread_setspecific(KeyOfThreads().key, made.get()) != 0) throw std::bad_alloc();
+    return *made.release();
 }
 
 }  // namespace
@@ -102,16 +125,18 @@ Answer AnswerOf(Status status) {
 
 // Without memory for them the diagnostics are those of no call.
 int Note(int rmid, const Answer& answer) noexcept try {
-    OfThisThread()[rmid] = Diagnose(answer);
+    MadeForThisThread()[rmid] = Diagnose(answer);
     return answer.code;
 } catch (...) {
-    OfThisThread().erase(rmid);
+    if (Diagnostics* const own = OfThisThread()) own->erase(rmid);
     return answer.code;
 }
 
 bool Noted(int rmid, SQLCA& diagnostics) {
-    const auto found = OfThisThread().find(rmid);
-    if (found == OfThisThread().end()) return false;
+    const Diagnostics* const own = OfThisThread();
+    if (!own) return false;
+    const auto found = own->find(rmid);
+    if (found == own->end()) return false;
     diagnostics = found->second;
     return true;
 }

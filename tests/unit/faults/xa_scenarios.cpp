@@ -1,0 +1,133 @@
+// The XA switch: a manager of the process, on a file of the world's folder, and a branch that makes two rows or none.
+#include <cstring>
+
+#include "faults/scenarios.h"
+#include "xa.h"
+
+namespace faults {
+namespace {
+
+constexpr int kManager = 7;
+XID branch{5, 2, 1, "xab"};
+
+using Entry = int (*xa_switch_t::*)(XID*, int, xa_long);
+int CallOf(Entry entry, xa_long flags) { return (rmXaSwitch.*entry)(&branch, kManager, flags); }
+
+std::string info;    // of the manager
+int Open() { return rmXaSwitch.xa_open_entry(info.data(), kManager, TMNOFLAGS); }
+int Close() { return rmXaSwitch.xa_close_entry(nullptr, kManager, TMNOFLAGS); }
+int Recovered() {
+    XID found[2];
+    const int count = rmXaSwitch.xa_recover_entry(found, 2, kManager, TMSTARTRSCAN | TMENDRSCAN);
+    EXPECT_TRUE(count != 1 || std::memcmp(&found[0], &branch, sizeof branch) == 0);
+    return count;
+}
+OCISvcCtx* Session() { return xaoSvcCtx(World::Text("faults")); }
+
+// A call of the switch. One that memory fails in has done nothing: repeated, it answers as ever.
+template <class Call>
+void XaStep(World& w, const char* name, int expected, Call call) {
+    int code = XA_OK;
+    try {
+        w.Step(name, [&] { return (code = call()) < 0 ? OCI_ERROR : OCI_SUCCESS; }, Told::code);
+        EXPECT_EQ(code, expected) << name;
+    } catch (const Stopped&) {
+        SQLCA why{};
+        const bool is_told = XaGetInfo(kManager, &why) == XA_OK;    // unless there was no memory for that, either
+        EXPECT_EQ(code, XAER_RMERR) << name;
+        EXPECT_TRUE(!is_told || why.sqlcode == -kOutOfMemory) << name << ": " << why.sqlcode;
+        EXPECT_EQ(call(), expected) << name << ", repeated";
+        throw;
+    }
+}
+void BranchStep(World& w, const char* name, Entry entry, xa_long flags) {
+    XaStep(w, name, XA_OK, [=] { return CallOf(entry, flags); });
+}
+
+void MakeTable(World& w) {
+    info = "DB=faults+SesTm=60+SqlNet=" + w.Folder() + "/xa.db";
+    EXPECT_EQ(Open(), XA_OK);
+    {
+        const Instead svc(w.svc, Session());
+        w.Sql("create table x(n number)");
+    }
+    EXPECT_EQ(Close(), XA_OK);
+}
+
+// Opens the manager, starts the branch and inserts; whatever becomes of that, the branch can be rolled back.
+void Insert(World& w) {
+    EXPECT_EQ(OCIInitialize(OCI_DEFAULT, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release),
+              OCI_SUCCESS);
+    w.AtEnd([&w] {
+        EXPECT_EQ(Open(), XA_OK);
+        (void)CallOf(&xa_switch_t::xa_start_entry, TMRESUME);    // whatever it is now, it goes
+        (void)CallOf(&xa_switch_t::xa_end_entry, TMFAIL);
+        (void)CallOf(&xa_switch_t::xa_rollback_entry, TMNOFLAGS);
+        EXPECT_EQ(CallOf(&xa_switch_t::xa_forget_entry, TMNOFLAGS), XAER_NOTA);
+        {
+            const Instead svc(w.svc, Session());
+            const std::string rows = w.One("select count(*) from x");
+            EXPECT_TRUE(rows == "0" || rows == "2") << rows;
+            w.Sql("delete from x");
+            w.Sql("commit");
+        }
+        EXPECT_EQ(Close(), XA_OK);
+        return OCITerminate(OCI_DEFAULT);
+    });
+    XaStep(w, "xa_open", XA_OK, Open);
+    BranchStep(w, "xa_start", &xa_switch_t::xa_start_entry, TMNOFLAGS);
+    const Instead svc(w.svc, Session());
+    w.Run("insert into x values(1)");
+}
+
+void InsertMore(World& w, xa_long leaves, xa_long takes_up) {
+    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, leaves);
+    BranchStep(w, "xa_start", &xa_switch_t::xa_start_entry, takes_up);
+    const Instead svc(w.svc, Session());
+    w.Run("insert into x values(2)");
+}
+
+void SeeRows(World& w) {
+    const Instead svc(w.svc, Session());
+    w.See(w.One("select count(*) from x"));
+}
+
+void TwoPhases(World& w) {
+    Insert(w);
+    InsertMore(w, TMSUSPEND, TMRESUME);
+    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMSUCCESS);
+    BranchStep(w, "xa_prepare", &xa_switch_t::xa_prepare_entry, TMNOFLAGS);
+    XaStep(w, "xa_recover", 1, Recovered);
+    BranchStep(w, "xa_commit", &xa_switch_t::xa_commit_entry, TMNOFLAGS);
+    SeeRows(w);
+    XaStep(w, "xa_close", XA_OK, Close);
+}
+
+void OnePhase(World& w) {
+    Insert(w);
+    InsertMore(w, TMSUCCESS, TMJOIN);
+    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMSUCCESS);
+    BranchStep(w, "xa_commit", &xa_switch_t::xa_commit_entry, TMONEPHASE);
+    SeeRows(w);
+}
+
+void RolledBack(World& w) {
+    Insert(w);
+    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMSUSPEND | TMMIGRATE);
+    BranchStep(w, "xa_start", &xa_switch_t::xa_start_entry, TMRESUME);
+    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMFAIL);
+    BranchStep(w, "xa_rollback", &xa_switch_t::xa_rollback_entry, TMNOFLAGS);
+    SeeRows(w);
+}
+
+constexpr Scenario kScenarios[] = {
+    {"XaTwoPhases", Ground::session, MakeTable, TwoPhases, "2;"},
+    {"XaOnePhase", Ground::session, MakeTable, OnePhase, "2;"},
+    {"XaRolledBack", Ground::session, MakeTable, RolledBack, "0;"},
+};
+
+}  // namespace
+
+std::span<const Scenario> XaScenarios() { return kScenarios; }
+
+}  // namespace faults
