@@ -173,6 +173,13 @@ Errno RoundFraction(const Interval& value, int digits, Interval* result) noexcep
     return TakeSeconds(value.whole, (value.nanosecond + half) / unit * unit, result);
 }
 
+unsigned LeadingDigits(const Interval& value) noexcept {
+    const std::int64_t leading = value.span == Span::year_month ? YearMonthOf(value).year : DaySecondOf(value).day;
+    unsigned digits = 2;
+    for (std::int64_t rest = (leading < 0 ? -leading : leading) / 100; rest > 0; rest /= 10) ++digits;
+    return digits;
+}
+
 Errno ToText(const Interval& value, unsigned leading, unsigned fraction, char* text, std::size_t* length) noexcept {
     if (leading > kMostDigits || fraction > kMostDigits) return errors::kBadPrecision;
     Interval shown;

@@ -42,6 +42,8 @@ Errno RoundFraction(const Interval& value, int digits, Interval* result) noexcep
 // *length is set on success.
 constexpr std::size_t kMaxIntervalText = 32;
 Errno ToText(const Interval& value, unsigned leading, unsigned fraction, char* text, std::size_t* length) noexcept;
+// As many digits as the years or days have, two at least.
+unsigned LeadingDigits(const Interval& value) noexcept;
 // Reads "[+-]years[-months]" or "[+-]days[ hours[:minutes[:seconds[.fraction]]]]", blanks around it aside. 1867 for
 // what is written otherwise.
 Errno FromText(std::string_view text, Span span, Interval* result) noexcept;

@@ -175,6 +175,8 @@ private:
             Replace(token, token.End(), function);
         } else if (IsDateLiteral(index)) {
             return VisitDateLiteral(index);
+        } else if (const std::size_t end = VisitIntervalLiteral(index)) {
+            return end;
         } else if (IsDecode(index)) {
             decode_begin_ = index + 1;
             Replace(token, tokens_[index + 1].End(), dialect_.decode->begin);
@@ -234,6 +236,11 @@ private:
         std::string arguments;
         int depth = 0;
         std::size_t index = as + 1;
+        if (const auto* type = FindCast(index); type && !type->sizes.empty()) {
+            const std::size_t first = index;
+            index += MatchWords(index, type->written);
+            arguments = ", " + IntervalSizes(first, type->sizes, index);
+        }
         for (; tokens_[index].kind != TokenKind::end; ++index) {
             const Token& token = tokens_[index];
             if (token.Is(")") && --depth < 0) break;
@@ -377,6 +384,23 @@ private:
         if (date::FromEngineText(literal.text.substr(1, literal.text.size() - 2), &value) != 0) return index + 2;
         Replace(tokens_[index], literal.End(), dialect_.date_literal(value, tokens_[index].Is("date")));
         return index + 2;
+    }
+
+    // interval '1-2' year to month becomes the call that casts its text; answers 0 for what is none.
+    std::size_t VisitIntervalLiteral(std::size_t index) {
+        if (!tokens_[index].Is("interval") || At(tokens_, index + 1).kind != TokenKind::literal) return 0;
+        for (const auto& cast : dialect_.casts) {
+            if (cast.sizes.empty()) continue;
+            const std::string_view fields = cast.written.substr(cast.written.find(' ') + 1);
+            const std::size_t matched = MatchWords(index + 2, fields);
+            if (matched == 0) continue;
+            std::size_t end = index + 2 + matched;
+            const std::string sizes = IntervalSizes(index + 1, cast.sizes, end);
+            const std::string text = std::string(cast.engine) + "(" + std::string(tokens_[index + 1].text) + ", " + sizes + ")";
+            Replace(tokens_[index], tokens_[end - 1].End(), text);
+            return end;
+        }
+        return 0;
     }
 
     // A word of the dialect's lists: one that stands alone, no name's part, no call, no alias; or a call.

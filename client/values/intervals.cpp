@@ -16,15 +16,6 @@ IntervalPlace* PlaceAt(const char* at) {
     return FindInterval(pointer);
 }
 
-// Two digits of years or days at least, and six of the fraction.
-unsigned LeadingDigits(const date::Interval& value) {
-    const std::int64_t leading =
-        value.span == date::Span::year_month ? date::YearMonthOf(value).year : date::DaySecondOf(value).day;
-    unsigned digits = 2;
-    for (std::int64_t rest = (leading < 0 ? -leading : leading) / 100; rest > 0; rest /= 10) ++digits;
-    return digits;
-}
-
 template <date::Span span>
 int PutInterval(const Datum& datum, Workspace&, Target& target) {
     IntervalPlace* const place = PlaceAt(target.at);
@@ -46,7 +37,7 @@ int FromInterval(const Source& source, Workspace& workspace, Datum& datum) {
     if (!place->value) return errors::kBadInterval;
     const unsigned fraction = place->value->nanosecond % 1000 == 0 ? 6 : 9;
     std::size_t length = 0;
-    const int error = date::ToText(*place->value, LeadingDigits(*place->value), fraction, workspace.small.data(), &length);
+    const int error = date::ToText(*place->value, date::LeadingDigits(*place->value), fraction, workspace.small.data(), &length);
     datum.kind = engine::Kind::text;
     datum.length = static_cast<std::uint32_t>(length);
     datum.data = workspace.small.data();

@@ -36,6 +36,8 @@ constexpr Dialect::Spelling kTypes[] = {
     {"rowid", "tid"},
     {"timestamp with local time zone", "timestamptz"},
     {"timestamp with time zone", "timestamptz"},
+    {"interval year to month", "kelp.year_month", true},
+    {"interval day to second", "interval day to second"},    // without the digits of the days
 };
 
 // The moment of the statement; the server's own words mean that of the transaction.

@@ -9,11 +9,11 @@
 namespace engine::postgres {
 namespace {
 
-// Texts come in UTF-8 and dates in the form that is read here; a lock is waited for as long as on other engines, unless
+// Texts come in UTF-8, dates and intervals in the form that is read here; a lock is waited for as long as on other engines, unless
 // the URL says otherwise. What follows is what the server tells of itself.
 constexpr const char* kPrime =
     "select pg_catalog.set_config('client_encoding', 'UTF8', false), pg_catalog.set_config('datestyle', 'ISO, DMY', false),"
-    " pg_catalog.set_config('bytea_output', 'hex', false),"
+    " pg_catalog.set_config('bytea_output', 'hex', false), pg_catalog.set_config('intervalstyle', 'sql_standard', false),"
     " pg_catalog.set_config('standard_conforming_strings', 'on', false),"
     " case when pg_catalog.current_setting('lock_timeout') = '0'"
     " then pg_catalog.set_config('lock_timeout', '2000', false) end,"
@@ -23,7 +23,7 @@ constexpr const char* kPrime =
     " pg_catalog.has_database_privilege(pg_catalog.current_database(), 'create')"
     " and pg_catalog.current_setting('server_version_num')::int >= 140000"
     " and not pg_catalog.pg_is_in_recovery()";
-enum : int { kServerVersion = 5, kTwoPhase = 6, kBanner = 7, kSchema = 8, kMayMakeSchema = 9 };
+enum : int { kServerVersion = 6, kTwoPhase = 7, kBanner = 8, kSchema = 9, kMayMakeSchema = 10 };
 
 // What stands in the schema goes before the server's own, and behind the user's.
 constexpr const char* kSetPath =

@@ -211,6 +211,7 @@ Status PgQuery::DescribeColumns(const PGresult* result) {
         DescribeType(type, PQfmod(result, index), columns_[place]);
         columns_[place].name = type == oid::kTupleId ? "ROWID" : ShownName(PQfname(result, index));
         readers_[place] = binary_ ? BinaryReader(type) : TextReader(type);
+        if (const Reader reader = IntervalReader(columns_[place], binary_)) readers_[place] = reader;
         const Oid table = PQftable(result, index);
         const auto number = static_cast<std::size_t>(std::max(PQftablecol(result, index), 0));
         if (table == 0 || number == 0) continue;
@@ -220,6 +221,7 @@ Status PgQuery::DescribeColumns(const PGresult* result) {
         const TableColumn& column = known->columns[number];
         DescribeColumn(type, PQfmod(result, index), column.domain, columns_[place]);
         columns_[place].nullable = column.described.nullable;
+        if (const Reader reader = IntervalReader(columns_[place], binary_)) readers_[place] = reader;
         if (IsLob(columns_[place])) readers_[place] = binary_ ? WholeBinaryReader(type) : WholeTextReader(type);
         if (auto lob = LobColumnOf(*known, number, columns_[place])) lobs_.push_back({place, std::move(lob)});
     }

@@ -1,6 +1,7 @@
 // Functions and operators in the server's own language, in a schema that the session's search path has before the
 // server's own: they take the place of what has the same name and types there. Bodies are bound when they are made, with
-// the server's own names alone in the path. A date is a domain, so that a result tells that it is one.
+// the server's own names alone in the path. A date is a domain, so that a result tells that it is one;
+// so is an interval of years and months, from which the server would cut days without a word.
 #include "engine/postgres/schema.h"
 
 namespace engine::postgres {
@@ -18,7 +19,8 @@ declare
 begin
     for made in
         select * from (values ('date', 'timestamp(0)'), ('raw', 'bytea'), ('long_raw', 'bytea'), ('long', 'text'),
-            ('nclob', 'text'), ('dbclob', 'text')) as list(name, type)
+            ('nclob', 'text'), ('dbclob', 'text'), ('year_month', 'interval check (extract(day from value) = 0 and
+            extract(hour from value) = 0 and extract(minute from value) = 0 and extract(second from value) = 0)')) as list(name, type)
     loop
         begin
             execute format('create domain kelp.%I as %s', made.name, made.type);
@@ -266,7 +268,7 @@ begin
         end;
     end loop;
 end $$;
-comment on schema kelp is 'libkelpci 2';
+comment on schema kelp is 'libkelpci 3';
 commit;
 )sql";
 

@@ -5,6 +5,8 @@
 #include <array>
 #include <charconv>
 #include <cstdlib>
+#include <optional>
+#include <utility>
 
 #include "date/format.h"
 #include "handles/errors.h"
@@ -105,6 +107,36 @@ int ReadDay(std::string_view bytes, ValueRoom& room, Datum& value) {
     return GiveDate(DaysTo(Get<std::int32_t>(bytes.data()), room.date), room, value);
 }
 
+// Years and months, or days and what is shorter: both at once are no interval here, nor the other span in a column of
+// one. `digits` of the fraction, of days; kOfMonths of months; kEither where the value itself tells.
+constexpr int kOfMonths = -1, kMostFraction = 6, kEither = 7;
+
+int GiveInterval(std::int64_t months, std::int64_t days, std::int64_t microseconds, int digits, ValueRoom& room,
+                 Datum& value) {
+    constexpr std::int64_t kSecond = 1'000'000;
+    const bool has_days = days != 0 || microseconds != 0;
+    const bool of_months = digits == kOfMonths || (digits == kEither && months != 0);
+    if (of_months ? has_days : months != 0) return errors::kBadInterval;
+    date::Interval interval{date::Span::year_month, months, 0};
+    std::int64_t all = 0;
+    if (!of_months) {
+        if (__builtin_mul_overflow(days, 86400 * kSecond, &all) || __builtin_add_overflow(all, microseconds, &all))
+            return errors::kLeadingPrecision;
+        interval = {date::Span::day_second, all / kSecond, static_cast<std::int32_t>(all % kSecond * 1000)};
+    }
+    std::size_t length = 0;
+    const auto fraction = static_cast<unsigned>(of_months ? 0 : std::min(digits, kMostFraction));
+    const int error = date::ToText(interval, date::LeadingDigits(interval), fraction, room.interval, &length);
+    SetView(value, Kind::text, room.interval, length);
+    return error;
+}
+
+template <int digits>
+int ReadInterval(std::string_view bytes, ValueRoom& room, Datum& value) {
+    const char* const at = bytes.data();
+    return GiveInterval(Get<std::int32_t>(at + 12), Get<std::int32_t>(at + 8), Get<std::int64_t>(at), digits, room, value);
+}
+
 int ReadTupleId(std::string_view bytes, ValueRoom& room, Datum& value) {
     room.row = RowIdOf(bytes.data());
     SetView(value, Kind::row_id, &room.row, sizeof room.row);
@@ -153,6 +185,25 @@ int TextToWholeBytes(std::string_view text, ValueRoom& room, Datum& value) {
     return value.kind == Kind::null ? ReadWhole<Kind::bytes>({text.data(), 0}, room, value) : 0;
 }
 
+// "-1-2", "1 2:03:04.5", "-2:03:04.5", "0": what has parts of two signs, or of both spans, is written otherwise.
+template <int digits>
+int TextToInterval(std::string_view text, ValueRoom& room, Datum& value) {
+    if (text == "0") return GiveInterval(0, 0, 0, digits, room, value);
+    const bool is_negative = text.starts_with('-');
+    const std::string_view plain = text.substr(is_negative);
+    char with_days[date::kMaxIntervalText + 2] = "0 ";
+    const bool has_days = plain.find_first_of(" -") != plain.npos;
+    if (plain.size() > date::kMaxIntervalText) return errors::kBadInterval;
+    const std::string_view whole =
+        has_days ? plain : std::string_view(with_days, 2 + plain.copy(with_days + 2, date::kMaxIntervalText));
+    const date::Span span = plain.find('-') != plain.npos ? date::Span::year_month : date::Span::day_second;
+    date::Interval read;
+    if (const int error = date::FromText(whole, span, &read)) return error;
+    if (is_negative) read = date::Negative(read);
+    if (span == date::Span::year_month) return GiveInterval(read.whole, 0, 0, digits, room, value);
+    return GiveInterval(0, 0, read.whole * 1'000'000 + read.nanosecond / 1000, digits, room, value);
+}
+
 int TextToTupleId(std::string_view text, ValueRoom& room, Datum& value) {
     char bytes[kTupleIdSize];
     char* end = nullptr;
@@ -196,6 +247,7 @@ constexpr TypeRow kTypes[] = {
     {oid::kDate, ReadDay, TextToDate, SQLT_DAT, kDateSize, 0, 0},
     {oid::kTimestamp, ReadTimestamp, TextToDate, SQLT_TIMESTAMP, kTimestampSize, 0, 6},
     {oid::kMoment, ReadMoment, TextToDate, SQLT_TIMESTAMP_TZ, kZonedSize, 0, 6},
+    {oid::kInterval, ReadInterval<kEither>, TextToInterval<kEither>, SQLT_CHR, 0, 0, 0},
     {oid::kNumeric, ReadNumeric, TextToNumber, SQLT_NUM, kNumberSize, 0, kFloating},
     {oid::kCursor, ReadCursor, ReadCursor, SQLT_RSET, 8, 0, 0},
 };
@@ -214,6 +266,31 @@ void DescribeNumber(int modifier, Column& column) {
     column.scale = static_cast<std::int8_t>(std::clamp(scale, -84, 127));
 }
 
+// Of all digits that the leading part may have: the server knows no limit of its own.
+void DescribeSpan(std::uint16_t span, int fraction, Column& column) {
+    constexpr std::uint8_t kMostDigits = 9;
+    column.type = span;
+    column.size = span == SQLT_INTERVAL_YM ? 5 : 11;
+    column.precision = kMostDigits;
+    column.scale = static_cast<std::int8_t>(std::min(fraction, kMostFraction));
+}
+
+// The modifier of an interval: the fields that it has, as bits, above the digits of the fraction. A column with fields
+// of both spans stays what it is.
+void DescribeInterval(int modifier, Column& column) {
+    constexpr int kMonths = 1 << 1 | 1 << 2;                         // month, year
+    constexpr int kDays = 1 << 3 | 1 << 10 | 1 << 11 | 1 << 12;      // day, hour, minute, second
+    const int fields = modifier >> 16 & 0x7FFF;
+    if ((fields & ~kMonths) == 0) DescribeSpan(SQLT_INTERVAL_YM, 0, column);
+    else if ((fields & ~kDays) == 0) DescribeSpan(SQLT_INTERVAL_DS, modifier & 0xFFFF, column);
+}
+
+template <int... digits>
+Reader ReaderOfDigits(int wanted, bool binary, std::integer_sequence<int, digits...>) {
+    constexpr Reader kBinary[] = {ReadInterval<digits>...}, kText[] = {TextToInterval<digits>...};
+    return (binary ? kBinary : kText)[wanted];
+}
+
 }  // namespace
 
 void DescribeType(Oid type, int modifier, Column& column) {
@@ -229,6 +306,8 @@ void DescribeType(Oid type, int modifier, Column& column) {
         column.size = column.characters * kBytesOfCharacter;
     } else if (type == oid::kNumeric) {
         DescribeNumber(modifier, column);
+    } else if (type == oid::kInterval) {
+        DescribeInterval(modifier, column);
     } else if (type == oid::kTimestamp && modifier == 0) {    // how a date with its time is declared
         column.type = SQLT_DAT;
         column.size = kDateSize;
@@ -256,6 +335,7 @@ void DescribeColumn(Oid type, int modifier, std::string_view domain, Column& col
         {oid::kBytes, "", SQLT_BLOB, kLocatorSize, false},
     };
     DescribeType(type, modifier, column);
+    if (type == oid::kInterval && domain == "year_month") return DescribeSpan(SQLT_INTERVAL_YM, 0, column);
     for (const auto& row : kColumns) {
         if (row.type != type || row.domain != domain) continue;
         column.type = row.described;
@@ -295,6 +375,12 @@ Reader BinaryReader(Oid type) {
 Reader TextReader(Oid type) {
     const TypeRow* row = Find(type);
     return row ? row->text : ReadText;
+}
+
+Reader IntervalReader(const Column& column, bool binary) {
+    if (column.type == SQLT_INTERVAL_YM) return binary ? ReadInterval<kOfMonths> : TextToInterval<kOfMonths>;
+    if (column.type != SQLT_INTERVAL_DS) return nullptr;
+    return ReaderOfDigits(column.scale, binary, std::make_integer_sequence<int, kMostFraction + 1>());
 }
 
 Reader WholeBinaryReader(Oid type) { return type == oid::kBytes ? ReadWhole<Kind::bytes> : ReadWhole<Kind::text>; }
@@ -351,6 +437,17 @@ static int ReadDate(std::string_view text, date::DateTime& value) {
     return date::FromText(text, date::kTimestampModel, date::kEnglish, date::Scope::timestamp, &value) == 0 ? 0 : error;
 }
 
+// "2-3", "4 05:06:07.8" with a sign or without; what the server's own words say is left to it. A number alone may be years
+// or days.
+static int ReadInterval(std::string_view text, std::optional<date::Interval>& value) {
+    const std::size_t digits = std::min(text.find_first_of("0123456789"), text.size());
+    const std::size_t behind = std::min(text.find_first_not_of("0123456789", digits), text.size());
+    if (digits == text.size() || text.find_first_not_of(" 0123456789+-:.", digits) != text.npos) return 0;
+    if (behind == text.size()) return errors::kBadInterval;
+    const date::Span span = text[behind] == '-' ? date::Span::year_month : date::Span::day_second;
+    return date::FromText(text, span, &value.emplace());
+}
+
 // A text for a text goes as it lies there; for any other type it is the server that reads it, up to a zero.
 int BoundValues::WriteText(std::size_t index, std::string_view text) {
     if (IsTextType(types_[index])) {
@@ -361,6 +458,11 @@ int BoundValues::WriteText(std::size_t index, std::string_view text) {
     if (types_[index] == oid::kTimestamp || types_[index] == oid::kMoment) {
         const int error = ReadDate(text, date);
         return error != 0 ? error : WriteTime(index, date);
+    }
+    if (types_[index] == oid::kInterval) {
+        std::optional<date::Interval> interval;
+        if (const int error = ReadInterval(text, interval)) return error;
+        if (interval) return WriteInterval(index, *interval);
     }
     std::string& room = rooms_[index];
     room.assign(types_[index] == oid::kBytes ? "\\x" : "");
@@ -389,6 +491,21 @@ int BoundValues::WriteTime(std::size_t index, const date::DateTime& value) {
     std::string& room = rooms_[index];
     room.resize(sizeof microseconds);
     Put(microseconds, room.data());
+    Point(index, room.data(), room.size(), true);
+    return 0;
+}
+
+// Cut to the microseconds that the server has; it then rounds to the digits of the column.
+int BoundValues::WriteInterval(std::size_t index, const date::Interval& value) {
+    constexpr std::int64_t kDay = 86400;
+    const bool of_months = value.span == date::Span::year_month;
+    const std::int64_t months = of_months ? value.whole : 0, all = of_months ? 0 : value.whole;
+    if (months != static_cast<std::int32_t>(months)) return errors::kLeadingPrecision;
+    std::string& room = rooms_[index];
+    room.resize(16);
+    Put(all % kDay * 1'000'000 + value.nanosecond / 1000, room.data());
+    Put(static_cast<std::int32_t>(all / kDay), room.data() + 8);
+    Put(static_cast<std::int32_t>(months), room.data() + 12);
     Point(index, room.data(), room.size(), true);
     return 0;
 }

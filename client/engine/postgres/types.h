@@ -8,6 +8,7 @@
 #include <string_view>
 #include <vector>
 
+#include "date/interval.h"
 #include "engine/engine.h"
 #include "engine/postgres/binary.h"
 #include "engine/postgres/wire.h"
@@ -17,7 +18,7 @@ namespace engine::postgres {
 namespace oid {
 constexpr Oid kBool = 16, kBytes = 17, kInt8 = 20, kInt2 = 21, kInt4 = 23, kText = 25, kOid = 26, kTupleId = 27;
 constexpr Oid kFloat4 = 700, kFloat8 = 701, kDate = 1082, kTimestamp = 1114, kMoment = 1184;
-constexpr Oid kNumeric = 1700, kCursor = 1790;
+constexpr Oid kInterval = 1186, kNumeric = 1700, kCursor = 1790;
 }  // namespace oid
 
 // A column's type, size and numbers by type and modifier; name and nullability are left alone.
@@ -35,6 +36,7 @@ union ValueRoom {
     OCINumber number;
     date::DateTime date;
     RowId row;
+    char interval[date::kMaxIntervalText];
     ValueRoom() : number() {}
 };
 
@@ -45,6 +47,8 @@ Reader TextReader(Oid type);
 // The same of texts and bytes, but an empty one is no null.
 Reader WholeBinaryReader(Oid type);
 Reader WholeTextReader(Oid type);
+// The same of a column of intervals, which says of which span they are; null for any other column.
+Reader IntervalReader(const Column& column, bool binary);
 bool IsTextType(Oid type);
 
 // The type that a placeholder is declared as by the kind of its values; 0: the server finds one.
@@ -66,6 +70,7 @@ private:
     int WriteText(std::size_t index, std::string_view text);
     int WriteOwn(std::size_t index, std::string_view text);
     int WriteTime(std::size_t index, const date::DateTime& value);
+    int WriteInterval(std::size_t index, const date::Interval& value);
     void Point(std::size_t index, const void* data, std::size_t length, bool binary);
 
     std::vector<Oid> types_;

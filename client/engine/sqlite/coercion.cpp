@@ -7,9 +7,9 @@
 #include <cstring>
 
 #include "date/format.h"
-#include "date/interval.h"
 #include "engine/sqlite/characters.h"
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/interval_text.h"
 #include "handles/errors.h"
 #include "number/number.h"
 
@@ -90,12 +90,6 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
                                    : type == SQLT_TIMESTAMP_TZ ? date::kTimestampZoneModel
                                                                  : date::kTimestampModel;
     return date::FromText(text, model, date::kEnglish, is_date ? date::Scope::date : date::Scope::timestamp, &value);
-}
-
-bool NanosecondsOf(const date::Interval& interval, std::int64_t& nanoseconds) {
-    constexpr std::int64_t kSecond = 1000000000;
-    return !__builtin_mul_overflow(interval.whole, kSecond, &nanoseconds) &&
-           !__builtin_add_overflow(nanoseconds, std::int64_t{interval.nanosecond}, &nanoseconds);
 }
 
 }  // namespace
@@ -290,8 +284,8 @@ Status Coercion::ApplyInterval(Datum& value) {
             failure = date::ToText(read, column_.precision, static_cast<unsigned>(digits), text.data(), &length);
     }
     if (failure != 0) return Refuse(failure);
-    std::int64_t kept = read.whole;
-    if (!of_months && !NanosecondsOf(read, kept)) return Refuse(errors::kLeadingPrecision);
+    std::int64_t kept = 0;
+    if (!KeepInterval(read, kept)) return Refuse(errors::kLeadingPrecision);
     value.kind = Kind::integer;
     value.length = 0;
     value.integer = kept;

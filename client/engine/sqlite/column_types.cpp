@@ -85,6 +85,8 @@ constexpr TypeRow kTypes[] = {
     {"time", SQLT_TIMESTAMP, Measure::fraction, kTimestampSize, 0, 6},
     {"span_ym", SQLT_INTERVAL_YM, Measure::digits, 5, 2, 0},
     {"span_ds", SQLT_INTERVAL_DS, Measure::digits, 11, 2, 6},
+    {"interval year to month", SQLT_INTERVAL_YM, Measure::digits, 5, 2, 0},    // of a cast
+    {"interval day to second", SQLT_INTERVAL_DS, Measure::digits, 11, 2, 6},
     {"clob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0},
     {"nclob", SQLT_CLOB, Measure::none, kLocatorSize, 0, 0, true},
     {"dbclob", SQLT_DBCLOB, Measure::none, kLocatorSize, 0, 0},

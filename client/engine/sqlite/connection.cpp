@@ -170,7 +170,7 @@ Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint
     }
     if (code != SQLITE_OK) return Failure(database, code);
 
-    if (Status status = FindValueTargets(database, sql, made.targets); status.Failed()) return status;
+    if (Status status = FindValueTargets(database, sql, HasIntervals(), made.targets); status.Failed()) return status;
     if (utf8_) made.objects = FindObjectTargets(database, made.targets, lobs_);
     if (utf8_) made.lobs = FindLobItems(database, made.statement.get(), sql, lobs_, made.targets);
     const std::string rewritten = made.targets.Rewritten(sql);
@@ -201,6 +201,21 @@ Status SqliteConnection::SeeSchema(Schema& schema) {
     }
     schema = schema_;
     return {};
+}
+
+// Whether a table may have a column of intervals: looked at once for each state of the tables. Temporary tables, where
+// there are any, and those of attached files may. One that has been is not forgotten: its drop may be undone.
+bool SqliteConnection::HasIntervals() {
+    if (has_intervals_ || looked_for_intervals_ == schema_) return has_intervals_;
+    constexpr const char* kLook =
+        "select exists(select 1 from main.sqlite_schema where sql like '%span\\_%' escape '\\') or "
+        "exists(select 1 from pragma_database_list where seq > 0)";
+    int code = SQLITE_OK;
+    const StatementHandle look = CompileText(kLook, code, nullptr);
+    if (!look || sqlite3_step(look.get()) != SQLITE_ROW) return true;
+    has_intervals_ = sqlite3_column_int(look.get(), 0) != 0;
+    looked_for_intervals_ = schema_;
+    return has_intervals_;
 }
 
 // `end` tells where the statement ends in the text. None for a text without a statement.

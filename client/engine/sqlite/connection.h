@@ -149,6 +149,7 @@ private:
     void NoteTable(int action, const char* table) noexcept;
     static int OnAccess(void* self, int action, const char* first, const char* second, const char* schema,
                         const char* trigger);
+    bool HasIntervals();
     StatementHandle CompileText(std::string_view sql, int& code, std::size_t* end) noexcept;
     Status CompileOwn(Own own) noexcept;
     Status Run(Own own) noexcept;
@@ -169,6 +170,8 @@ private:
     bool utf8_ = true;
     std::string* table_ = nullptr;     // takes the table that the statement which is compiled changes
     Schema schema_;                    // as it was at data_version_
+    std::optional<Schema> looked_for_intervals_;
+    bool has_intervals_ = false;
     std::optional<unsigned> data_version_;
     std::chrono::steady_clock::time_point busy_since_;
     SqliteQuery* first_open_ = nullptr;

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <new>
+#include <utility>
 
 #include "engine/pieces.h"
 #include "engine/sqlite/column_types.h"
@@ -41,6 +42,23 @@ const Dialect::Spelling* FindCast(std::string_view word, bool& counts_characters
     return found == std::end(kCasts) ? nullptr : found;
 }
 
+// A cast's type as it was written, by the arguments of its function. An interval's sizes stand behind its second word and
+// its last; those that are understood were not written.
+std::string TypeAsWritten(const Dialect::Spelling& cast, std::string_view sizes, bool counts_characters) {
+    std::string written(cast.written);
+    if (sizes.empty()) return written;
+    if (cast.sizes.empty()) return written.append("(").append(sizes).append(counts_characters ? " char)" : ")");
+    const auto parts = [](std::string_view all) {
+        const std::size_t comma = std::min(all.find(','), all.size());
+        return std::pair(Trimmed(all.substr(0, comma)), Trimmed(all.substr(std::min(comma + 1, all.size()))));
+    };
+    const auto [leading, fraction] = parts(sizes);
+    const auto [usual_leading, usual_fraction] = parts(cast.sizes);
+    if (fraction != usual_fraction) written.append("(").append(fraction).append(")");
+    if (leading != usual_leading) written.insert(written.find(" to "), "(" + std::string(leading) + ")");
+    return written;
+}
+
 // An expression as the application wrote it: kelp_number(a , 5, 2) was cast(a as number(5, 2)).
 std::string AsWritten(std::string_view text) {
     Pieces pieces(text);
@@ -64,9 +82,8 @@ std::string AsWritten(std::string_view text) {
             const std::size_t close = pieces.At() - 1;
             std::string written(text.substr(0, begin));
             written += "cast(" + AsWritten(Trimmed(text.substr(open, (comma ? comma : close) - open))) + " as ";
-            written += cast->written;
-            if (comma) written.append("(").append(Trimmed(text.substr(comma + 1, close - comma - 1)));
-            if (comma) written.append(counts_characters ? " char)" : ")");
+            const std::string_view sizes = comma ? Trimmed(text.substr(comma + 1, close - comma - 1)) : std::string_view();
+            written += TypeAsWritten(*cast, sizes, counts_characters);
             return written + ")" + AsWritten(text.substr(close + 1));
         }
     }

@@ -15,6 +15,7 @@
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/function_values.h"
+#include "engine/sqlite/interval_text.h"
 #include "engine/sqlite/stored_number.h"
 #include "handles/errors.h"
 #include "number/number.h"
@@ -105,6 +106,28 @@ void ToDate(sqlite3_context* context, int count, Arguments arguments) {
     ReturnDate(context, value);
 }
 
+// span_ym(x, digits), span_ds(x, digits, digits of the fraction)
+template <std::uint16_t type>
+void ToInterval(sqlite3_context* context, int count, Arguments arguments) {
+    constexpr int kMostDigits = 9;
+    Column column;
+    column.type = type;
+    column.precision = static_cast<std::uint8_t>(std::clamp(sqlite3_value_int(arguments[1]), 0, kMostDigits));
+    if (count > 2) column.scale = static_cast<std::int8_t>(std::clamp(sqlite3_value_int(arguments[2]), 0, kMostDigits));
+    ReturnStored(context, std::move(column), arguments[0]);
+}
+
+// interval_text(x, 'declared type'): an interval as it is kept, as it is shown
+void ToIntervalText(sqlite3_context* context, int, Arguments arguments) {
+    Column column;
+    if (sqlite3_value_type(arguments[0]) != SQLITE_INTEGER || !ReadDeclaredType(TextOf(arguments[1]), column))
+        return sqlite3_result_value(context, arguments[0]);
+    IntervalText text;
+    const std::string_view written = WriteInterval(sqlite3_value_int64(arguments[0]), column, text);
+    if (written.empty()) return Refuse(context, errors::kInconsistentTypes);
+    sqlite3_result_text(context, written.data(), static_cast<int>(written.size()), SQLITE_TRANSIENT);
+}
+
 // The present moment in local time: as a date, or with fraction and zone.
 template <bool whole_seconds>
 void Now(sqlite3_context* context, int, Arguments) {
@@ -171,6 +194,9 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_nchar", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::characters>},
     {"kelp_date", 1, 1, SQLITE_DETERMINISTIC, ToDate<true>},
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
+    {"kelp_span_ym", 2, 2, SQLITE_DETERMINISTIC, ToInterval<SQLT_INTERVAL_YM>},
+    {"kelp_span_ds", 3, 3, SQLITE_DETERMINISTIC, ToInterval<SQLT_INTERVAL_DS>},
+    {"kelp_interval_text", 2, 2, SQLITE_DETERMINISTIC, ToIntervalText},
     {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::store>},
     {"kelp_compare", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::compare>},
     {"nvl", 2, 2, SQLITE_DETERMINISTIC, Nvl, "", 1},

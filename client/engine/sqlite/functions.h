@@ -29,6 +29,8 @@ inline constexpr Dialect::Spelling kCasts[] = {
     {"char", "kelp_char"},
     {"date", "kelp_date"},
     {"timestamp", "kelp_timestamp"},
+    {"interval year to month", "kelp_span_ym", false, "2"},
+    {"interval day to second", "kelp_span_ds", false, "2,6"},
 };
 
 // Behind the name of a text type, or of its cast, that counts characters: varchar2_chars(9).

@@ -43,6 +43,10 @@ bool IsComparison(std::string_view piece) {
     return Contains(kComparisons, piece);
 }
 
+bool IsOneOf(std::string_view piece, std::initializer_list<std::string_view> words) {
+    return std::any_of(words.begin(), words.end(), [&](std::string_view word) { return IsWord(piece, word); });
+}
+
 Operands::Operands(const std::vector<std::string_view>& pieces) : pieces_(pieces), partners_(pieces.size() + 1) {
     std::vector<std::size_t> open;
     std::fill(partners_.begin(), partners_.end(), pieces.size());
@@ -169,6 +173,16 @@ std::vector<Span> Operands::List(Span span) const {
         begin = at + 1;
     }
     return parts;
+}
+
+std::size_t Operands::FirstExpression() const {
+    if (IsOneOf(At(0), {"select", "with", "values", "insert", "replace", "update", "delete"})) return 0;
+    if (!IsWord(At(0), "create")) return pieces_.size();
+    std::size_t at = 1;
+    while (IsOneOf(At(at), {"temp", "temporary"})) ++at;
+    if (!IsOneOf(At(at), {"table", "view"})) return pieces_.size();
+    while (at < pieces_.size() && !(IsWord(At(at), "as") && IsQuery({at + 1, pieces_.size()}))) ++at;
+    return at;
 }
 
 }  // namespace engine::sqlite

@@ -1,6 +1,7 @@
 // Where an expression beside an operator begins and ends, and what it is. A view of the pieces of one statement.
 #pragma once
 
+#include <initializer_list>
 #include <string_view>
 #include <vector>
 
@@ -32,6 +33,10 @@ public:
     // The parts of (a, b, c); none for anything else.
     [[nodiscard]] std::vector<Span> List(Span span) const;
 
+    // Queries and changes are looked through from their start, what they define or explain is not; of create table and
+    // create view their query is.
+    [[nodiscard]] std::size_t FirstExpression() const;
+
 private:
     [[nodiscard]] bool IsOperand(std::size_t index) const;
     [[nodiscard]] std::size_t CaseEnd(std::size_t first) const;
@@ -44,6 +49,8 @@ private:
 
 // Words that no column or function is named by.
 bool IsKeyword(std::string_view piece);
+
+bool IsOneOf(std::string_view piece, std::initializer_list<std::string_view> words);    // in lower case
 
 bool IsComparison(std::string_view piece);
 

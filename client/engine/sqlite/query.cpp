@@ -48,7 +48,8 @@ SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, 
       verb_(VerbOf(sql_)),
       entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && IsSavepoint(sql)},
       parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))),
-      coercions_(CoercionsOf(compilation.targets, parameters_.size())) {}
+      coercions_(CoercionsOf(compilation.targets, parameters_.size())),
+      intervals_(std::move(compilation.targets.intervals)) {}
 
 SqliteQuery::~SqliteQuery() { Close(); }
 
@@ -69,6 +70,7 @@ Status SqliteQuery::FollowSchema() {
     std::uint32_t offset = 0;
     if (Status status = connection_.Make(sql_, made, offset); status.Failed()) return status;
     coercions_ = CoercionsOf(made.targets, parameters_.size());
+    intervals_ = std::move(made.targets.intervals);
     statement_ = std::move(made.statement);
     table_ = std::move(made.table);
     lobs_ = std::move(made.lobs);
@@ -99,10 +101,23 @@ void SqliteQuery::Describe() {
     if (sqlite3_column_count(statement_.get()) > 0) {
         sqlite3_stmt* const described = as_written_ ? as_written_.get() : statement_.get();
         DescribeColumns(connection_.Database(), described, sql_, columns_, untyped_);
+        DescribeIntervals();
     }
     any_untyped_ = std::find(untyped_.begin(), untyped_.end(), true) != untyped_.end();
     PlanReading();
     described_ = true;
+}
+
+void SqliteQuery::DescribeIntervals() {
+    for (const auto& [item, type] : intervals_) {
+        if (item >= columns_.size()) continue;
+        Column& column = columns_[item];
+        column.type = type.type;
+        column.size = type.size;
+        column.precision = type.precision;
+        column.scale = type.scale;
+        untyped_[item] = false;
+    }
 }
 
 SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {

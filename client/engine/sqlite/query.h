@@ -90,10 +90,11 @@ private:
 
     static Reading ReadingOf(const Column& column);
     void Describe();
+    void DescribeIntervals();
     void PlanReading();
+    void FillInterval(int index, Datum& value);
     void DescribeFromRow();
     [[nodiscard]] int Recompilations() const;
-    void FillInterval(int index, Datum& value);
 
     SqliteConnection& connection_;
     StatementHandle statement_;
@@ -108,6 +109,7 @@ private:
     State state_ = State::closed;
     std::vector<Datum> parameters_;
     Coercions coercions_;                 // by parameter; null where its values are taken as they are
+    std::vector<ValueTargets::Interval> intervals_;
     std::vector<DateText> dates_;                         // by parameter; empty until a date is bound
 
     bool described_ = false;

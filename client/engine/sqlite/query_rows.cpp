@@ -4,8 +4,8 @@
 #include <limits>
 #include <new>
 
-#include "date/interval.h"
 #include "engine/sqlite/characters.h"
+#include "engine/sqlite/interval_text.h"
 #include "engine/sqlite/query.h"
 #include "engine/sqlite/query_parts.h"
 #include "engine/sqlite/row_number.h"
@@ -251,21 +251,11 @@ void SqliteQuery::FillDate(int column, Datum& value) {
 
 // As the text that it is shown as. What the file of somebody else holds beyond that stays a number.
 void SqliteQuery::FillInterval(int index, Datum& value) {
-    constexpr std::int64_t kSecond = 1000000000;
     const auto column = static_cast<std::size_t>(index);
-    const Column& described = columns_[column];
-    const bool of_months = described.type == SQLT_INTERVAL_YM;
-    date::Interval interval{date::Span::year_month, value.integer, 0};
-    if (!of_months)
-        interval = {date::Span::day_second, value.integer / kSecond, static_cast<std::int32_t>(value.integer % kSecond)};
+    IntervalText shown;
     std::string& text = rooms_[column].padded;
-    text.resize(date::kMaxIntervalText);
-    std::size_t length = 0;
-    const auto fraction = static_cast<unsigned>(of_months ? 0 : described.scale);
-    if (date::ToText(interval, described.precision, fraction, text.data(), &length) != 0 &&
-        date::ToText(interval, 9, 9, text.data(), &length) != 0)
-        return;
-    SetView(value, Kind::text, text.data(), length);
+    text = WriteInterval(value.integer, columns_[column], shown);
+    if (!text.empty()) SetView(value, Kind::text, text.data(), text.size());
 }
 
 void SqliteQuery::FillNumber(int column, Datum& value) {

@@ -8,6 +8,7 @@
 #include "engine/pieces.h"
 #include "engine/sqlite/assignments.h"
 #include "engine/sqlite/comparisons.h"
+#include "engine/sqlite/interval_uses.h"
 #include "engine/sqlite/stored_number.h"
 #include "engine/sqlite/table_columns.h"
 #include "number/number.h"
@@ -45,11 +46,13 @@ struct Mark {
     const ValueTargets::Edit* edit;
 };
 
-// At one place ends come before beginnings, inner ends before outer ones, outer beginnings before inner ones.
+// At one place ends come before beginnings, inner ends before outer ones, outer beginnings before inner ones. Of two
+// edits of the same text the later one is the inner.
 bool ComesBefore(const Mark& left, const Mark& right) {
     if (left.at != right.at) return left.at < right.at;
     if (left.ends != right.ends) return left.ends;
-    return left.other > right.other;
+    if (left.other != right.other) return left.other > right.other;
+    return left.ends ? left.edit > right.edit : left.edit < right.edit;
 }
 
 }  // namespace
@@ -97,10 +100,12 @@ Status Convert(std::string_view text, const Column& column, Coercion::Purpose pu
     return {};
 }
 
-Status FindValueTargets(sqlite3* database, std::string_view sql, ValueTargets& targets) {
+Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_intervals, ValueTargets& targets) {
     const std::vector<std::string_view> pieces = Split(sql);
     Status status = FindAssignments(database, sql, pieces, targets);
-    return status.Ok() ? FindComparisons(database, sql, pieces, targets) : status;
+    if (status.Ok()) status = FindComparisons(database, sql, pieces, targets);
+    const bool uses = has_intervals || sql.find(kSpanPrefix) != sql.npos;
+    return status.Ok() && uses ? FindIntervalUses(database, sql, pieces, targets) : status;
 }
 
 }  // namespace engine::sqlite

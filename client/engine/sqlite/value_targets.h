@@ -41,7 +41,13 @@ struct ValueTargets {
         std::string column;
         LobKind kind;
     };
+    // An item of the select list that is shown, from 0, which answers an interval.
+    struct Interval {
+        std::size_t item;
+        Column column;
+    };
     std::vector<Parameter> parameters;
+    std::vector<Interval> intervals;
     std::vector<Object> objects;
     std::vector<Edit> edits;    // in any order
 
@@ -53,7 +59,7 @@ struct ValueTargets {
 Status Convert(std::string_view text, const Column& column, Coercion::Purpose purpose, std::string& literal);
 
 // Looks through a statement that SQLite has found to be well-formed. Refuses what compares values in a way whose
-// meaning cannot be told: 932, 933.
-Status FindValueTargets(sqlite3* database, std::string_view sql, ValueTargets& targets);
+// meaning cannot be told, or uses intervals as numbers: 932, 933. Tables have none unless `has_intervals`.
+Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_intervals, ValueTargets& targets);
 
 }  // namespace engine::sqlite

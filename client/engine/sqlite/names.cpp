@@ -1,0 +1,262 @@
+// Looking names up: the tables of each query are read once a statement, a table is asked for its columns each time.
+#include "engine/sqlite/names.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "engine/sqlite/column_types.h"
+#include "engine/sqlite/select_list.h"
+#include "handles/errors.h"
+
+namespace engine::sqlite {
+namespace {
+
+// What is kept as something that it does not look like.
+bool IsMoment(const Column& column) { return IsDateType(column.type) || IsIntervalType(column.type); }
+
+}  // namespace
+
+const TableColumn* Names::TypeOf(Span span) {
+    span = operands_.Bare(span);
+    if (span.Size() == 0 || operands_.IsValue(span)) return nullptr;
+    if (operands_.IsColumn(span)) return Resolve(span);
+    if (!IsName(At(span.first))) return nullptr;
+    const ExpressionType type = ReadType({pieces_.begin() + static_cast<std::ptrdiff_t>(span.first),
+                                          pieces_.begin() + static_cast<std::ptrdiff_t>(span.last)});
+    const TableColumn* column = nullptr;
+    if (!type.argument.empty()) {
+        const auto first = static_cast<std::size_t>(
+            std::find_if(pieces_.begin(), pieces_.end(),
+                         [&](auto piece) { return piece.data() == type.argument.front().data(); }) -
+            pieces_.begin());
+        column = Resolve({first, first + type.argument.size()});
+    } else if (!type.declared.empty()) {
+        TableColumn answered;
+        answered.declared = type.declared;
+        answered.concerned = ReadDeclaredType(type.declared, answered.column);
+        column = &columns_.emplace_back(std::move(answered));
+    }
+    return column && IsMoment(column->column) ? column : nullptr;
+}
+
+// ---- Names
+
+const TableColumn* Names::Resolve(Span name) {
+    if (scopes_.empty()) ReadTables();
+    const std::string qualifier = name.Size() > 1 ? PlainName(At(name.last - 3)) : std::string();
+    if (depth_ == 0) looks_ = 0;
+    return FindName(At(name.last - 1), qualifier, scopes_[name.first]).column;
+}
+
+// A column of the table that the qualifier says, or of those of the innermost query that has one so called; else of
+// any table, as behind what is not understood.
+Names::Found Names::FindName(std::string_view column, const std::string& qualifier, std::size_t scope) {
+    const auto is_meant = [&](const Table& table) {
+        return qualifier.empty() || sqlite3_stricmp(table.name.c_str(), qualifier.c_str()) == 0;
+    };
+    for (;; scope = parents_[scope]) {
+        const auto in_scope = [&](const Table& table) { return table.scope == scope && is_meant(table); };
+        const Found found = Agreed(column, in_scope);
+        if (found.any || !status_.Ok()) return found;
+        if (parents_[scope] == scope) break;
+    }
+    return Agreed(column, [](const Table& table) { return !table.is_target && table.query == 0; });
+}
+
+// The column of that name in the tables meant, if they agree on its type. Dates and intervals are too easily taken
+// for something else.
+template <class Meant>
+Names::Found Names::Agreed(std::string_view name, Meant is_meant) {
+    Found agreed;
+    for (std::size_t index = 0; index < tables_.size() && status_.Ok(); ++index) {
+        if (!is_meant(tables_[index])) continue;
+        const Found found = ColumnOf(tables_[index], name);
+        if (!found.any) continue;
+        const bool differs = agreed.column && found.column && agreed.column->column.type != found.column->column.type;
+        const bool dates = differs && (IsMoment(agreed.column->column) || IsMoment(found.column->column));
+        if (dates) status_ = Error(errors::kInconsistentTypes, "column " + PlainName(name));
+        if (differs) return {true, nullptr};
+        agreed = found;
+    }
+    return agreed;
+}
+
+Names::Found Names::ColumnOf(const Table& table, std::string_view name) {
+    if (table.query == 0) {
+        TableColumn column;
+        if (!ReadColumn(database_, table.table, name, column)) return {};
+        return {true, &columns_.emplace_back(std::move(column))};
+    }
+    constexpr int kMostLooks = 1000;   // subqueries that join each other twice and twice again
+    if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(table.query), "select")) return {};
+    ++depth_;
+    const Found found = ColumnOfQuery(table, PlainName(name));
+    --depth_;
+    return found;
+}
+
+// By the select list of a subquery, and the names that WITH gives to its columns.
+Names::Found Names::ColumnOfQuery(const Table& table, const std::string& name) {
+    const std::vector<Item> items = Items(table.query);
+    for (std::size_t index = 0; index < items.size(); ++index) {
+        const Item& item = items[index];
+        if (item.is_all && table.names.empty()) {
+            const Found found = FindName(name, item.qualifier, scopes_[table.query]);
+            if (found.any) return found;
+            continue;
+        }
+        const std::string_view called = index < table.names.size() ? table.names[index] : item.name;
+        if (sqlite3_stricmp(PlainName(called).c_str(), name.c_str()) == 0) return {true, TypeOf(item.expression)};
+    }
+    return {};
+}
+
+std::vector<Names::Item> Names::Items(std::size_t select) const {
+    std::vector<Item> items;
+    std::size_t begin = select + 1;
+    if (IsOneOf(At(begin), {"distinct", "all"})) ++begin;
+    for (std::size_t at = begin; at <= pieces_.size(); ++at) {
+        if (At(at) == "(") at = operands_.Partner(at) + 1;
+        const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" ||
+                          IsOneOf(At(at), {"from", "where", "group", "having", "window", "union", "except",
+                                           "intersect", "order", "limit"});
+        if (!ends && At(at) != ",") continue;
+        items.push_back(ReadItem({begin, at}));
+        if (ends) break;
+        begin = at + 1;
+    }
+    return items;
+}
+
+Names::Item Names::ReadItem(Span span) const {
+    Item item{span, {}, false, {}};
+    if (span.Size() == 0) return item;
+    const std::string_view last = At(span.last - 1);
+    if (last == "*") {
+        item.is_all = true;
+        if (span.Size() > 2) item.qualifier = PlainName(At(span.last - 3));
+    } else if (span.Size() > 2 && IsWord(At(span.last - 2), "as")) {
+        item.name = last;
+        item.expression.last -= 2;
+    } else if (operands_.From(span.first).last + 1 == span.last && IsName(last)) {
+        item.name = last;
+        --item.expression.last;
+    } else if (operands_.IsColumn(span)) {
+        item.name = last;
+    }
+    return item;
+}
+
+// The scope of each piece: a query, each part of a union for itself; what stands around the query of an insert is
+// none of its own. And the tables that are named behind from, join, into and update.
+void Names::ReadTables() {
+    scopes_.assign(pieces_.size(), 0);
+    parents_.assign(1, 0);
+    std::vector<std::size_t> open(1, 0);    // the scope at each depth of parentheses
+    const auto enter = [&](std::size_t parent) {
+        parents_.push_back(parent);
+        return parents_.size() - 1;
+    };
+    bool inserts = false;
+    for (std::size_t at = 0; at < pieces_.size(); ++at) {
+        const bool outside = open.size() == 1;
+        if (At(at) == "(") {
+            const bool is_query = operands_.IsQuery({at + 1, pieces_.size()});
+            if (is_query) NoteWith(at);
+            open.push_back(is_query ? enter(open.back()) : open.back());
+        } else if (At(at) == ")" && !outside) {
+            open.pop_back();
+        } else if (IsOneOf(At(at), {"union", "except", "intersect"})) {
+            const std::size_t parent = parents_[open.back()];
+            open.back() = enter(parent == open.back() ? parents_.size() : parent);
+        } else if (IsWord(At(at), "select") && inserts && outside && open.back() == 0) {
+            open.back() = enter(parents_.size());
+        } else if (IsOneOf(At(at), {"conflict", "returning"}) && outside) {
+            open.back() = 0;
+        }
+        scopes_[at] = open.back();
+        if (IsWord(At(at), "into")) inserts = true;
+        if (IsOneOf(At(at), {"from", "join", "into", "update"}))
+            ReadList(IsWord(At(at + 1), "or") ? at + 3 : at + 1, open.back(), IsWord(At(at), "into"));
+    }
+}
+
+// with NAME as (query), with NAME(a, b) as (query): the query opens at `open`.
+void Names::NoteWith(std::size_t open) {
+    std::size_t at = open;
+    while (at > 0 && IsOneOf(At(at - 1), {"materialized", "not"})) --at;
+    if (at < 2 || !IsWord(At(at - 1), "as")) return;
+    With with;
+    with.query = open + 1;
+    at -= 2;
+    if (At(at) == ")") {
+        const std::size_t names = operands_.Partner(at);
+        for (std::size_t name = names + 1; name < at; name += 2) with.names.push_back(At(name));
+        at = names - 1;
+    }
+    with.name = PlainName(At(at));
+    withs_.push_back(std::move(with));
+}
+
+void Names::ReadList(std::size_t at, std::size_t scope, bool is_target) {
+    while (At(at) == "(" && !operands_.IsQuery({at + 1, pieces_.size()})) ++at;
+    for (;;) {
+        const bool is_query = At(at) == "(";
+        if (!is_query && (!IsName(At(at)) || IsKeyword(At(at)))) return;
+        Table& table = tables_.emplace_back();
+        table.scope = scope;
+        table.is_target = is_target;
+        if (is_query) {
+            table.query = at + 1;
+            at = operands_.Partner(at) + 1;
+        } else {
+            at = ReadTableName(pieces_, at, table.table);
+            table.name = table.table.name;
+            UseWith(table);
+        }
+        if (IsWord(At(at), "as")) ++at;
+        if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
+        if (At(at) != ",") return;
+        ++at;
+    }
+}
+
+// A name that WITH has given hides a table's.
+void Names::UseWith(Table& table) const {
+    for (const With& with : withs_) {
+        if (sqlite3_stricmp(with.name.c_str(), table.name.c_str()) != 0) continue;
+        table.query = with.query;
+        table.names = with.names;
+    }
+}
+
+// Of an item "*" or "t.*" of a query: whether intervals are among what it stands for.
+bool Names::HasIntervals(std::size_t select, const std::string& qualifier) {
+    if (scopes_.empty()) ReadTables();
+    for (const Table& table : tables_) {
+        const bool is_meant = qualifier.empty() || sqlite3_stricmp(table.name.c_str(), qualifier.c_str()) == 0;
+        if (table.scope != scopes_[select] || !is_meant) continue;
+        if (table.query == 0 ? TableHasIntervals(table.table) : QueryHasIntervals(table.query)) return true;
+    }
+    return false;
+}
+
+bool Names::TableHasIntervals(const TableName& table) const {
+    const std::vector<TableColumn> columns = InsertableColumns(database_, table);
+    return std::any_of(columns.begin(), columns.end(), [](const TableColumn& c) { return IsIntervalType(c.column.type); });
+}
+
+bool Names::QueryHasIntervals(std::size_t query) {
+    if (depth_ >= kDeepest) return true;
+    ++depth_;
+    const std::vector<Item> items = Items(query);
+    const bool found = std::any_of(items.begin(), items.end(), [&](const Item& item) {
+        if (item.is_all) return HasIntervals(query, item.qualifier);
+        const TableColumn* const column = TypeOf(item.expression);
+        return column && IsIntervalType(column->column.type);
+    });
+    --depth_;
+    return found;
+}
+
+}  // namespace engine::sqlite

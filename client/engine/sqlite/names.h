@@ -1,0 +1,93 @@
+// The names in a statement's expressions: which table's column one is, through subqueries and WITH, and of which type an
+// expression is as far as its pieces tell. A view of the pieces of one statement, on the thread that compiles it.
+#pragma once
+
+#include <sqlite3.h>
+
+#include <cstddef>
+#include <deque>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "engine/pieces.h"
+#include "engine/sqlite/operands.h"
+#include "engine/sqlite/table_columns.h"
+#include "handles/status.h"
+
+namespace engine::sqlite {
+
+class Names {
+public:
+    Names(sqlite3* database, const std::vector<std::string_view>& pieces, const Operands& operands)
+        : database_(database), pieces_(pieces), operands_(operands) {}
+
+    // The column that a name is; null for a calculated one, and for none. Columns live as long as this object.
+    const TableColumn* Resolve(Span name);
+    // The column that an expression is, or one of the type of the date or interval that it answers; else null.
+    const TableColumn* TypeOf(Span span);
+    // 932 when a name was of a date or an interval in one table and of another type in another.
+    [[nodiscard]] const Status& Failure() const { return status_; }
+
+    // An expression of a select list, and what it is called.
+    struct Item {
+        Span expression;
+        std::string_view name;
+        bool is_all = false;      // * or t.*
+        std::string qualifier;
+    };
+    [[nodiscard]] std::vector<Item> Items(std::size_t select) const;
+    bool HasIntervals(std::size_t select, const std::string& qualifier);
+
+private:
+    static constexpr int kDeepest = 30;    // a recursive query looks into itself
+
+    // A table or subquery of the statement, where it is named.
+    struct Table {
+        std::size_t scope = 0;
+        bool is_target = false;    // of an insert
+        std::string name;          // its alias, if it has one
+        TableName table;
+        std::size_t query = 0;                  // where a subquery begins; 0: a table
+        std::vector<std::string_view> names;    // of a subquery's columns, where WITH tells them
+    };
+    struct With {
+        std::string name;
+        std::size_t query = 0;
+        std::vector<std::string_view> names;
+    };
+
+    // What a name is found to be. A column of a subquery that is calculated is found, and is no table's column.
+    struct Found {
+        bool any = false;
+        const TableColumn* column = nullptr;
+    };
+
+    [[nodiscard]] std::string_view At(std::size_t index) const { return operands_.At(index); }
+    Found FindName(std::string_view column, const std::string& qualifier, std::size_t scope);
+    template <class Meant>
+    Found Agreed(std::string_view name, Meant is_meant);
+    Found ColumnOf(const Table& table, std::string_view name);
+    Found ColumnOfQuery(const Table& table, const std::string& name);
+    [[nodiscard]] Item ReadItem(Span span) const;
+    [[nodiscard]] bool TableHasIntervals(const TableName& table) const;
+    bool QueryHasIntervals(std::size_t query);
+    void ReadTables();
+    void NoteWith(std::size_t open);
+    void ReadList(std::size_t at, std::size_t scope, bool is_target);
+    void UseWith(Table& table) const;
+
+    sqlite3* database_;
+    const std::vector<std::string_view>& pieces_;
+    const Operands& operands_;
+    Status status_;
+    std::vector<std::size_t> scopes_;     // by piece
+    std::vector<std::size_t> parents_;    // by scope; the outermost is its own
+    std::deque<Table> tables_;
+    std::vector<With> withs_;
+    int depth_ = 0;                       // of subqueries looked into, and how many for one name
+    int looks_ = 0;
+    std::deque<TableColumn> columns_;     // that were told of, and what calls answer
+};
+
+}  // namespace engine::sqlite
