@@ -53,13 +53,13 @@ void ChunkFile::GiveBack(std::span<const std::uint32_t> chunks) noexcept {
 
 Status ChunkFile::Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const {
     if (chunk >= kInMemory) return ReadTemporaryFile(file_, Place(chunk - kInMemory, at), out);
-    std::memcpy(out.data(), memory_[chunk].get() + at, out.size());
+    std::copy_n(memory_[chunk].get() + at, out.size(), out.begin());
     return {};
 }
 
 Status ChunkFile::Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const {
     if (chunk >= kInMemory) return WriteTemporaryFile(file_, Place(chunk - kInMemory, at), in);
-    std::memcpy(memory_[chunk].get() + at, in.data(), in.size());
+    std::copy(in.begin(), in.end(), memory_[chunk].get() + at);    // nothing may be no place at all
     return {};
 }
 
