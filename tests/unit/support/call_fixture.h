@@ -60,15 +60,15 @@ protected:
         return folder_;
     }
 
-    // A database "work", which ann may log on to: in the folder or, with KELP_TEST_ENGINE=postgres, on the server of the
+    // A database, which ann may log on to: in the folder or, with KELP_TEST_ENGINE=postgres, on the server of the
     // test run.
-    void MakeDatabase() {
+    void MakeDatabase(const char* name = "work") {
         const char* const engine = std::getenv("KELP_TEST_ENGINE");
         const std::string ini = Folder() + "/kelpcli.ini";
         if (!engine || std::string_view(engine) != "postgres") return;
         server_ = std::make_unique<PostgresDatabase>();
         ann_ = server_->Owner();
-        std::ofstream(ini) << "[work]\nurl=" << server_->Url() << '\n';
+        std::ofstream(ini) << '[' << name << "]\nurl=" << server_->Url() << '\n';
     }
     [[nodiscard]] bool OnServer() const { return server_ != nullptr; }
 

@@ -9,11 +9,13 @@
 
 namespace {
 
-// Two databases, opened as managers 1 and 2; statements of an environment of the test's own.
+// Two databases, opened as managers 1 and 2, the first of them the server's where the tests run there; statements of an
+// environment of the test's own.
 class XaCalls : public CallFixture {
 protected:
     void SetUp() override {
         Folder();
+        MakeDatabase("one");
         CallFixture::SetUp();
         stmt_ = New<OCIStmt>(OCI_HTYPE_STMT);
         ASSERT_EQ(Open(1, "DB=one"), XA_OK);
