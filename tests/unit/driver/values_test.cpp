@@ -64,6 +64,7 @@ TEST(Values, TextsStoredAndShown) {
         {SQLT_DAT, 7, "2024-02-29-13:05:00", 7, 7, "\"2024-02-29-13:05:00\"\n"},
         {SQLT_DAT, 7, "2023-02-29-13:05:00", 7, 7, "Invalid date found\n"},
         {SQLT_DAT, 7, "2024-12-31", 7, 7, "\"2024-12-31-00:00:00\"\n"},
+        {SQLT_DAT, 3, "2024-12-31", 7, 7, "Invalid date found\n"},
         {SQLT_ODT, 8, "1999-01-02-03:04:60", 8, 8, "1999-01-02-03:04:60\n"},
         {SQLT_ODT, 8, "1999-01-02-03:04:61", 8, 8, "1999-01-02-03:04:61\nInvalid OCITimeSS - 61\n"}};
     for (const auto& c : cases) {

@@ -174,7 +174,8 @@ TEST_F(Postgres, WhatTheServerSaysAsNumbers) {
         {"select 1 from nowhere", 942},            {"select nosuch(1)", 904},
         {"select (select n from p union all select 2)", 1427}, {"create table p(n integer)", 955},
         {"select max(n), n from p", 937},          {"select 1 'x", 1756},
-        {"insert into p values(1, 2)", 913},       {"select 1; select 2", 933}};
+        {"insert into p values(1, 2)", 913},       {"select 1; select 2", 933},
+        {"alter table c add foreign key(n, p) references p(n)", 2270}};
     for (const auto& c : cases) {
         const std::string answer = EffectOf(c.sql) == Effect::reads ? Query(c.sql) : "error " + std::to_string(Run(c.sql));
         EXPECT_EQ(answer, "error " + std::to_string(c.number)) << c.sql;

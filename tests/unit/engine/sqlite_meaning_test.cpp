@@ -65,6 +65,7 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from t where (d = % or 1 = 0)", "03-FEB-24", "1;"},
         {"select id from t where substr(c, 1, 2) = %", "ab", "1;2;"},
         {"select id from t where exists(select 1 from u where u.e > % and u.id = t.id)", "02-FEB-24 09.00.00 AM", "1;"},
+        {"select x.id from u as y, t as x where x.d = %", "03-FEB-24", "1;"},
         {"select t.id from t, u x where t.id = x.id and e > %", "03-FEB-24 09.59.00 AM", "1;"},
         {"select id from t where (d) = %", "03-FEB-24", "1;"},
         {"select id from t where ((t.d)) = (%)", "03-FEB-24", "1;"},

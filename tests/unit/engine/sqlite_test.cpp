@@ -192,7 +192,7 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
          " months_between('0001-01-05', '-0001-01-05')", "1,decimal -1.51612903225806451612903225806451612903,12;"},
         {"last_day('2024-02-01 01:02:03'), next_day('2024-02-09', 'friday'), next_day('2024-02-09', 1)",
          "time 2024-02-29 01:02:03,time 2024-02-16 00:00:00,time 2024-02-11 00:00:00;"},
-        {"next_day('2024-02-09', 'nonday')", "error 1846"},
+        {"next_day('2024-02-09', 'nonday')", "error 1846"}, {"next_day('10:00:00', 'friday')", "error 932"},
         {"trunc(2.79), trunc(-2.79, 1), trunc(1279, -2), trunc('5.5')", "2,real -2.7,1200,5;"},
         {"trunc('2024-02-09 13:14:15'), trunc(to_date('09-02-24', 'DD-MM-YY'), 'yyyy')",
          "2024-02-09 00:00:00,time 2024-01-01 00:00:00;"},
@@ -340,7 +340,7 @@ TEST_F(Sqlite, AccountsAreNobodysBusiness) {
     for (const char* sql :
          {"update kelp_accounts set password = ''", "delete from kelp_accounts", "delete from Main.KELP_Accounts",
           "insert into kelp_accounts values('BOB', '', '')", "drop table kelp_accounts",
-          "alter table kelp_accounts rename to x", "alter table kelp_accounts add y", "create index i on kelp_accounts(name)",
+          "alter table kelp_accounts rename to x", "alter table kelp_accounts add y", "create index i on kelp_accounts(name)", "delete from sqlite_master",
           "create trigger g after insert on kelp_accounts begin select 1; end", "select password from kelp_accounts",
           "select * from kelp_accounts", "select count(*) from kelp_accounts where password like '$y$%'",
           "insert into t select n from t returning (select max(password) from kelp_accounts)"}) {

@@ -256,6 +256,8 @@ TEST_F(AttributesTest, LastCall) {
     OCIStmtFetch(stmt_, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT);
     EXPECT_EQ(last(), 28u);
     EXPECT_EQ(last(), 28u) << "asking does not count";
+    OCIStmtSetPieceInfo(New<OCIBind>(OCI_HTYPE_BIND), OCI_HTYPE_BIND, err_, nullptr, nullptr, 0, nullptr, nullptr);
+    EXPECT_EQ(last(), 61u);
     OCIBreak(svc_, err_);
     EXPECT_EQ(last(), 50u);
     OCIPing(svc_, err_, OCI_DEFAULT);
@@ -271,6 +273,7 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
     ASSERT_EQ(Describe(describe, "T", OCI_PTYPE_TABLE), 0);
     dvoid *root = nullptr, *again = nullptr, *columns = nullptr;
+    EXPECT_EQ(Member(describe, &root, 0, OCI_HTYPE_DESCRIBE), 24334);
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
     const std::int64_t blocks = [&] {
         for (ub4 position = 1; position <= 3; ++position) again = Below(root, OCI_ATTR_LIST_COLUMNS, position);

@@ -155,6 +155,14 @@ TEST_F(Pools, WhichSessionComes) {
         {nullptr, OCI_SESSGET_PURITY_NEW, nullptr, "found /3"}};
     int line = 0;
     for (const auto& c : cases) EXPECT_EQ(come_and_go(c.tag, c.mode, c.retag), c.came) << line++;
+    come_and_go("e", 0, "e");
+    auto* fresh = New<OCIAuthInfo>(OCI_HTYPE_AUTHINFO);
+    ub4 purity = 1;
+    EXPECT_EQ(Answer(OCIAttrSet(fresh, OCI_HTYPE_AUTHINFO, &purity, 0, OCI_ATTR_PURITY, err_)), 0);
+    OCISvcCtx* svc = nullptr;
+    EXPECT_EQ(Get(&svc, err_, kSpool, "e", fresh), 0);
+    EXPECT_FALSE(found_) << "asked for by the handle: one that nobody had";
+    EXPECT_EQ(Release(svc), 0);
 }
 
 TEST_F(Pools, SessionsOfSeveralUsers) {
@@ -248,7 +256,7 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     sb4 length = 0;
     const auto create = [&](const char* database, const char* password, ub4 mode) {
         return Answer(OCIConnectionPoolCreate(env_, err_, pool, &name, &length, Text(database),
-                                              static_cast<sb4>(Length(database)), 1, 1, 1, Text(ann_), Length(ann_.c_str()),
+                                              static_cast<sb4>(Length(database)), 0, 1, 1, Text(ann_), Length(ann_.c_str()),
                                               Text(password), 6, mode));
     };
     EXPECT_EQ(create("/nowhere/x.db", "secret", 0), 24400);
@@ -256,6 +264,8 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     EXPECT_EQ(create("work", "secret", OCI_CPOOL_REINITIALIZE), 24395);
     ASSERT_EQ(create("work", "secret", 0), 0);
     EXPECT_EQ(create("work", "secret", 0), 24407);
+    const auto size = [&](ub4 attribute) { return Attribute<ub4>(pool, OCI_HTYPE_CPOOL, attribute); };
+    EXPECT_EQ(size(OCI_ATTR_CONN_MIN) * 100 + size(OCI_ATTR_CONN_MAX) * 10 + size(OCI_ATTR_CONN_INCR), 11u);
     auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
     ASSERT_EQ(Answer(OCIServerAttach(server, err_, name, length, OCI_CPOOL)), 0);
     auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);

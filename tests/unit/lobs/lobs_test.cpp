@@ -169,6 +169,21 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
     for (const auto& c : refused)
         EXPECT_EQ(Answer(OCILobCopy(svc, err, c.to, c.from, c.amount, c.at, c.source)), c.answer) << c.answer;
     EXPECT_EQ(Read(binary), std::string("3:\1\2\3"));
+    ASSERT_EQ(Write(other, 1, std::string(100000, 'a')), 0);
+    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 100000, 1, 1)), 0);    // in several steps
+    EXPECT_EQ(LengthOf(lob), 100000u);
+    MustRun("create table n(n nclob, b blob)", "insert into n values('x', x'00000000000000000000000000000000000000000000000000000000000000000000000000000000')");
+    char digits[3];
+    sb2 indicator = 0;
+    EXPECT_EQ(Query("select b from n", {{digits, 3, SQLT_CHR, &indicator}}), 1406);
+    EXPECT_EQ(indicator, 80) << "of bytes as text, the digits";
+    Fetch(other, "select n from n", SQLT_DBCLOB);
+    const struct { OCILobLocator* of; ub1 form; } forms[] = {{lob, SQLCS_IMPLICIT}, {binary, 0}, {other, SQLCS_NCHAR}};
+    for (const auto& c : forms) {
+        ub1 form = 9;
+        EXPECT_EQ(Answer(OCILobCharSetForm(env, err, c.of, &form)), 0);
+        EXPECT_EQ(form, c.form);
+    }
 }
 
 TEST_F(Lobs, BindsAndReturningTakeLocators) {
@@ -258,7 +273,12 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     EXPECT_EQ(Write(lob, 1, "x", OCI_NEXT_PIECE), 24801);
     EXPECT_EQ(Write(lob, 1, "x", OCI_ONE_PIECE, &(length = 2)), 22921);
     EXPECT_EQ(Read(lob, kPast), "11:h\xC3\xA4llo world");
-    oraub8 far = ~oraub8{0};
+    oraub8 far = 3;
+    char bytes[] = "\xC3\xB6xyz";
+    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, &far, nullptr, 1, bytes, 5, 0, nullptr, nullptr, 0, 0)), 0);
+    EXPECT_EQ(Read(lob, 4), "4:\xC3\xB6xll") << "the amount in bytes";
+    EXPECT_EQ(Write(lob, 1, "h\xC3\xA4"), 0);
+    far = ~oraub8{0};
     EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &(far = 1), ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)), 24281);
     OCISvcCtx* elsewhere = nullptr;
     ASSERT_EQ(Logon(&elsewhere), OCI_SUCCESS);

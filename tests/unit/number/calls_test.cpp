@@ -84,6 +84,8 @@ TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
     size = static_cast<ub4>(-1);
     EXPECT_EQ(write(&size, text), OCI_ERROR);
     EXPECT_EQ(Recorded(), 21560);
+    EXPECT_EQ(OCINumberAbs(error_, &value, nullptr), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 21560);
     OCINumber result;
     EXPECT_EQ(FromText(Bytes("1x"), Bytes("99"), &result), OCI_ERROR);
     EXPECT_EQ(Recorded(), 22062);

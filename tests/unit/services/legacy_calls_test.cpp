@@ -111,6 +111,7 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     EXPECT_EQ(opinit(2), 24300);
     EXPECT_EQ(opinit(1), 0);
     EXPECT_EQ(olog(&other, nullptr, nullptr, 0, nullptr, 0, T(":memory:"), 8, 0), 24301);
+    EXPECT_EQ(olog(&other, host.data(), nullptr, -2, nullptr, 0, T(":memory:"), 8, 0), 1025);
     EXPECT_EQ(opinit(0), 0);
     sqllda(&other);
     EXPECT_EQ(other.rc, 1012);

@@ -217,6 +217,7 @@ TEST(SqlText, SpellingsThatADialectAsksFor) {
         {"select x'0A', x from \"T\"", "select <0A>, x from \"q\""},
         {"select decode(:a, 1, 'x', 2, f(3, 4)), decode(a, 1, 2, 3) from t",
          "select [?1|is  1|then  'x'|or  2|then  f(3, 4)], [a|is  1|then  2|else  3] from t"},
+        {"select decode(a, 1, f(3, 4), 3) from t", "select [a|is  1|then  f(3, 4)|else  3] from t"},
         {"select decode(a, decode(b, 1, 2), 3), decode(a, 'hex') from t",
          "select [a|is  [b|is  1|then  2]|then  3], decode(a, 'hex') from t"},
         {"select (select 1) from (select 2), (values(1)) join (select 3) x on 1 = 1 where a in (select 4)",

@@ -216,6 +216,8 @@ TEST_F(Executing, BlockOpensResultSets) {
         OCIStmt* const block = std::exchange(stmt, element);
         EXPECT_EQ(Attribute<ub2>(OCI_ATTR_STMT_TYPE), OCI_STMT_SELECT);
         EXPECT_EQ(Attribute<ub4>(OCI_ATTR_PARAM_COUNT), 2u);
+        const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, svc, OCI_HTYPE_SVCCTX);
+        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), 1u);
         sb4 values[2] = {};
         ASSERT_EQ(Define(1, Int(values[0])) + Define(2, Int(values[1])), 0);
         EXPECT_EQ(Fetch(), 0);

@@ -186,7 +186,9 @@ TEST_F(XaCalls, ThreadsOfControl) {
         waits.set_value();
         EXPECT_EQ(Call(kStart, xid, TMJOIN, 5), XA_OK);
         EXPECT_EQ(Call(kEnd, xid, TMSUSPEND | TMMIGRATE, 5), XA_OK);
-        EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 5, TMNOFLAGS), XA_OK);
+        EXPECT_EQ(Open(6, "SqlNet=one"), XA_OK);
+        EXPECT_NE(xaoSvcCtx(nullptr), nullptr) << "the thread's own goes before the process's";
+        for (const int rmid : {6, 5}) EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, rmid, TMNOFLAGS), XA_OK);
     });
     waits.get_future().wait();
     EXPECT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK);
