@@ -151,6 +151,14 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
                                  Gives, 0, 0)), 24811);
 }
 
+TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
+    MustRun("create table n(k integer, c clob)", "insert into n values(1, '" + std::string(50000, 'a') + "')",
+            "insert into n values(2, '" + std::string(50000, 'b') + "')");
+    Fetch(lob, "select c from n where k = 1");
+    Fetch(other, "select c from n where k = 2");
+    for (int round = 0; round < 2; ++round) EXPECT_EQ(Read(lob, 1, 40000) + Read(other, 1, 40000), "1:a1:b");
+}
+
 TEST_F(Lobs, CopiesStayWithinTheirKind) {
     OCILobLocator* binary = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
     Fetch(lob);
