@@ -78,12 +78,13 @@ std::shared_ptr<const Node> SelectedColumn(const engine::Column& column, std::ui
     return node;
 }
 
-std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, std::string version) {
+std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, engine::Database& database) {
     auto node = std::make_shared<Node>();
     const KindRow& row = RowOf(object.kind);
     node->shown = row.shown;
     node->type = row.type;
-    node->version = std::move(version);
+    if (object.kind == engine::ObjectKind::database) node->version = database.Version();
+    node->knows_nowait = !database.GetDialect().cuts_for_update;
     switch (object.kind) {
         case engine::ObjectKind::table:
         case engine::ObjectKind::view: node->list = Columns(std::move(object.columns)); break;

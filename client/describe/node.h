@@ -28,6 +28,7 @@ struct Node {
     std::uint32_t position = 0;           // of columns, from 1
     engine::ObjectDescription object;     // of objects, without its columns and members
     std::string version;                  // of the database
+    bool knows_nowait = false;            // of the database: whether "for update nowait" is more than words
     std::shared_ptr<const Node> list;     // of objects: their columns, objects or schemas; null: none are known
     std::uint16_t list_type = OCI_LTYPE_UNK;             // of lists, as what follows
     std::uint32_t first = 1;                             // the position of the first member
@@ -36,6 +37,6 @@ struct Node {
 
 std::shared_ptr<const Node> SelectedColumn(const engine::Column& column, std::uint32_t position);
 // An object with the lists below it.
-std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, std::string version);
+std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, engine::Database& database);
 
 }  // namespace describe

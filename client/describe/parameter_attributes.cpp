@@ -199,6 +199,10 @@ Status Number(Parameter& parameter, AttributeValue& value) {
 Status Version(Parameter& parameter, AttributeValue& value) {
     return Keep(parameter, parameter.Node().version, value);
 }
+Status Nowait(Parameter& parameter, AttributeValue& value) {
+    value.integer = parameter.Node().knows_nowait ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED;
+    return {};
+}
 template <std::uint8_t answer>
 Status Answer(Parameter&, AttributeValue& value) {
     value.integer = answer;
@@ -287,7 +291,7 @@ constexpr ShownRow kAll[] = {
     {Row<Zero>(OCI_ATTR_MAX_CATALOG_NAMELEN, Shape::ub1), Only(Shown::database)},    // there are none
     {Row<Answer<OCI_CL_START>>(OCI_ATTR_CATALOG_LOCATION, Shape::ub1), Only(Shown::database)},
     {Row<Answer<OCI_SP_SUPPORTED>>(OCI_ATTR_SAVEPOINT_SUPPORT, Shape::ub1), Only(Shown::database)},
-    {Row<Answer<OCI_NW_UNSUPPORTED>>(OCI_ATTR_NOWAIT_SUPPORT, Shape::ub1), Only(Shown::database)},
+    {Row<Nowait>(OCI_ATTR_NOWAIT_SUPPORT, Shape::ub1), Only(Shown::database)},
     {Row<Answer<OCI_AC_DDL>>(OCI_ATTR_AUTOCOMMIT_DDL, Shape::ub1), Only(Shown::database)},
     {Row<Answer<OCI_LOCK_IMMEDIATE>>(OCI_ATTR_LOCKING_MODE, Shape::ub1), Only(Shown::database)},
 };

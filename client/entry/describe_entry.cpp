@@ -42,9 +42,7 @@ Status Describe(ServiceContext& service, std::string_view name, const Describabl
     engine::ObjectDescription object;
     Status status = turn.link->Engine().Describe(name, *wanted.kind, object);
     if (status.Failed()) return status;
-    const bool is_database = object.kind == engine::ObjectKind::database;
-    std::string version = is_database ? turn.link->Database().Version() : std::string();
-    root = describe::DescribedObject(std::move(object), std::move(version));
+    root = describe::DescribedObject(std::move(object), turn.link->Database());
     return status;
 }
 

@@ -328,6 +328,28 @@ void BlockThatUndoesItself(World& w) {
     w.See(Rows(w));
 }
 
+void TableOfIntervals(World& w) { w.Sql("create table spans(ym interval year to month, v varchar2(20))"); }
+
+// Bound, defined, cast, as a text, and refused.
+void IntervalValues(World& w) {
+    auto* months = w.NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
+    w.STEP(OCIIntervalFromText, w.env, w.err, World::Text("-1-2"), 4, months);
+    w.Prepare("insert into spans values(:1, cast(:2 as interval year to month))");
+    w.Bind(1, {&months, 8, SQLT_INTERVAL_YM});
+    w.Bind(2, {&months, 8, SQLT_INTERVAL_YM});
+    w.Execute();
+    auto* back = w.NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
+    char text[20] = "";
+    w.Prepare("select max(ym), v from spans where ym < interval '0-1' year to month group by v");
+    w.Define(1, {&back, 8, SQLT_INTERVAL_YM});
+    w.Define(2, {text, sizeof text, SQLT_STR});
+    w.Execute(1);
+    sword order = 9;
+    w.STEP(OCIIntervalCompare, w.env, w.err, months, back, &order);
+    w.See(order);
+    w.See(text);
+}
+
 void PiecesIn(World& w) {
     EarlierRow(w);
     sb4 numbers[2] = {1, 2};
@@ -500,6 +522,7 @@ constexpr Scenario kScenarios[] = {
     {"IndexTables", Ground::session, Table, IndexTables, "5;number of the index table 5;"},
     {"BlockThatUndoesItself", Ground::session, Table, BlockThatUndoesItself, "0earlier;"},
     {"PiecesIn", Ground::session, Table, PiecesIn, "0earlier,1first and a longer one to follow it and last,2alone;"},
+    {"IntervalValues", Ground::session, TableOfIntervals, IntervalValues, "0;-01-02;"},
     {"DynamicData", Ground::session, Table, DynamicData,
      "a value that is given in two piecesa value that is given in two piecesa value that is given in two pieces;"},
     {"StatementCache", Ground::session, Table, StatementCache, "1;2;1;3;2;"},
