@@ -78,13 +78,12 @@ std::shared_ptr<const Node> SelectedColumn(const engine::Column& column, std::ui
     return node;
 }
 
-std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, engine::Database& database) {
+std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, DatabaseFacts facts) {
     auto node = std::make_shared<Node>();
     const KindRow& row = RowOf(object.kind);
     node->shown = row.shown;
     node->type = row.type;
-    if (object.kind == engine::ObjectKind::database) node->version = database.Version();
-    node->knows_nowait = !database.GetDialect().cuts_for_update;
+    node->database = std::move(facts);
     switch (object.kind) {
         case engine::ObjectKind::table:
         case engine::ObjectKind::view: node->list = Columns(std::move(object.columns)); break;

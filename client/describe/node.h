@@ -21,14 +21,19 @@ enum class Shown : std::uint16_t {
     member = 512     // an object in a list: of what kind it is and what it is called
 };
 
+// What is told of a database besides what is in it.
+struct DatabaseFacts {
+    std::string version;
+    bool knows_nowait = false;    // "for update nowait" is more than words
+};
+
 struct Node {
     Shown shown = Shown::selected;
     std::uint8_t type = OCI_PTYPE_COL;    // OCI_PTYPE_*
     engine::Column column;                // of columns
     std::uint32_t position = 0;           // of columns, from 1
     engine::ObjectDescription object;     // of objects, without its columns and members
-    std::string version;                  // of the database
-    bool knows_nowait = false;            // of the database: whether "for update nowait" is more than words
+    DatabaseFacts database;               // of the database
     std::shared_ptr<const Node> list;     // of objects: their columns, objects or schemas; null: none are known
     std::uint16_t list_type = OCI_LTYPE_UNK;             // of lists, as what follows
     std::uint32_t first = 1;                             // the position of the first member
@@ -37,6 +42,6 @@ struct Node {
 
 std::shared_ptr<const Node> SelectedColumn(const engine::Column& column, std::uint32_t position);
 // An object with the lists below it.
-std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, engine::Database& database);
+std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, DatabaseFacts facts);
 
 }  // namespace describe

@@ -197,10 +197,10 @@ Status Number(Parameter& parameter, AttributeValue& value) {
 }
 
 Status Version(Parameter& parameter, AttributeValue& value) {
-    return Keep(parameter, parameter.Node().version, value);
+    return Keep(parameter, parameter.Node().database.version, value);
 }
 Status Nowait(Parameter& parameter, AttributeValue& value) {
-    value.integer = parameter.Node().knows_nowait ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED;
+    value.integer = parameter.Node().database.knows_nowait ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED;
     return {};
 }
 template <std::uint8_t answer>

@@ -42,7 +42,10 @@ Status Describe(ServiceContext& service, std::string_view name, const Describabl
     engine::ObjectDescription object;
     Status status = turn.link->Engine().Describe(name, *wanted.kind, object);
     if (status.Failed()) return status;
-    root = describe::DescribedObject(std::move(object), turn.link->Database());
+    describe::DatabaseFacts facts;
+    if (object.kind == engine::ObjectKind::database)
+        facts = {turn.link->Database().Version(), !turn.link->Database().GetDialect().cuts_for_update};
+    root = describe::DescribedObject(std::move(object), std::move(facts));
     return status;
 }
 

@@ -297,6 +297,9 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     EXPECT_EQ(Name(root, OCI_ATTR_OBJ_NAME), "T") << "as it was";
     EXPECT_EQ(Describe(describe, Schema(), OCI_PTYPE_SCHEMA), 0);
     EXPECT_EQ(OCIDescriptorFree(columns, OCI_DTYPE_PARAM), OCI_INVALID_HANDLE) << "gone with what it described";
+    const std::string database = OnServer() ? ann_.substr(4) : "memory";    // of the owner's name
+    EXPECT_EQ(Attribute<ub1>(Described(database.c_str(), OCI_PTYPE_DATABASE), OCI_DTYPE_PARAM, OCI_ATTR_NOWAIT_SUPPORT),
+              OnServer() ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED);
 }
 
 TEST_F(AttributesTest, CurrentSchema) {

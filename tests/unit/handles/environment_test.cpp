@@ -25,7 +25,7 @@ TEST(Parameters, SequencesAndSynonyms) {
     engine::ObjectDescription object;
     object.kind = engine::ObjectKind::sequence;
     object.sequence_least = -7, object.sequence_most = 1234, object.sequence_step = 2, object.sequence_mark = 0;
-    handle->Show(describe::DescribedObject(object, ""));
+    handle->Show(describe::DescribedObject(object, {}));
     const auto number = [](std::string_view bytes) { return std::string(bytes) + std::string(22 - bytes.size(), '\0'); };
     EXPECT_EQ(get(OCI_ATTR_MIN), number("\x03\x3e\x5e\x66"));
     EXPECT_EQ(get(OCI_ATTR_MAX), number("\x03\xc2\x0d\x23"));
@@ -36,7 +36,7 @@ TEST(Parameters, SequencesAndSynonyms) {
     object = {};
     object.kind = engine::ObjectKind::synonym;
     object.name = "S", object.target = "T", object.target_schema = "MAIN";
-    handle->Show(describe::DescribedObject(object, ""));
+    handle->Show(describe::DescribedObject(object, {}));
     EXPECT_EQ(get(OCI_ATTR_NAME), "T");
     EXPECT_EQ(get(OCI_ATTR_SCHEMA_NAME), "MAIN");
     EXPECT_EQ(get(OCI_ATTR_OBJ_NAME), "S");
