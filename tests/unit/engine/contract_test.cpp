@@ -166,6 +166,12 @@ TEST_P(Contract, LongArraysKeepTheirValuesAndFailTheirRows) {
     ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 4, .last = 2500}, stopped).Ok());
     EXPECT_EQ(stopped.executed, 1497u) << "0 is the first of two";
     EXPECT_EQ(Count(), "1497;");
+    ASSERT_EQ(Run("delete from t"), 0);
+    rows.refused_row = 9999;
+    for (auto& row : rows.rows) row = {row[0], Text("x")};
+    ASSERT_TRUE(Prepared("insert into t(n, v) values(%1 + 1, upper(%2))", std::vector{Integer(1), Text("x")})
+                    ->ExecuteArray(rows, {.first = 20, .last = 40}, outcome).Ok());
+    EXPECT_EQ(Query("select sum(n), max(v) from t"), "610,X;") << "more than placeholders";
 }
 
 TEST_P(Contract, ChangesReturnTheirRowsByExecution) {

@@ -95,6 +95,33 @@ TEST_F(Transactions, BranchesInMemoryStayWhereTheyAre) {
     EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_DEFAULT)), 0);
 }
 
+// Each branch has its own answer; those of one global transaction alone are prepared together.
+TEST_F(Transactions, SeveralAreReadiedInOneCall) {
+    OCITrans* branches[2] = {};
+    OCIError* errors[2] = {err_, New<OCIError>(OCI_HTYPE_ERROR)};
+    for (int index : {0, 1}) branches[index] = Attribute<OCITrans*>(svc_[index], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
+    const auto name = [&](const char* data) {
+        XID xid{5, 2, 1, {}};
+        std::memcpy(xid.data, data, 3);
+        EXPECT_EQ(Answer(OCIAttrSet(branches[1], OCI_HTYPE_TRANS, &xid, sizeof xid, OCI_ATTR_XID, err_)), 0);
+    };
+    const auto prepare = [&] { return OCITransMultiPrepare(svc_[1], 2, branches, errors); };
+    name("txc");
+    ASSERT_EQ(Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
+    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
+    EXPECT_EQ(prepare(), OCI_ERROR);
+    EXPECT_EQ(FirstCode(errors[0]), 25351) << "another session works in it";
+    EXPECT_EQ(FirstCode(errors[1]), 24767) << "the other one is ready all the same: it has changed nothing";
+    ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    name("tyc");
+    EXPECT_EQ(prepare(), OCI_ERROR);
+    EXPECT_EQ(FirstCode(errors[0]), 0);
+    EXPECT_EQ(FirstCode(errors[1]), 24781);
+    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_TRANS_TWOPHASE)), 0);
+    EXPECT_EQ(Run(1, "insert into t select 1 / count(*) from t"), 0);
+}
+
 // A promise that a deferred foreign key would break is not given.
 TEST_F(Transactions, TheFirstPhaseChecksWhatWasDeferred) {
     ASSERT_EQ(Run(0, "create table p(id integer primary key)"), 0);
