@@ -120,7 +120,16 @@ Status PgConnection::KeepsPrepared(const Xid& xid, bool& kept) {
     kept = false;
     if (!home_->TwoPhase()) return {};
     Result found;
-    Status status = Ask("select 1 from pg_catalog.pg_prepared_xact() where gid = $1", {NameOf(xid)}, found);
+    const std::string question = "execute kelp_branch('" + NameOf(xid) + "')";    // there are no quotes in it
+    Status status;
+    if (asks_of_branches_) status = Ask(question.c_str(), {}, found);
+    if (!asks_of_branches_ || (!status.Ok() && !Broken())) {    // the application may have dropped all statements
+        asks_of_branches_ = false;
+        status = Ask("prepare kelp_branch(text) as select 1 from pg_catalog.pg_prepared_xact() where gid = $1", {}, found);
+        if (!status.Ok()) return status;
+        asks_of_branches_ = true;
+        status = Ask(question.c_str(), {}, found);
+    }
     kept = status.Ok() && PQntuples(found.get()) > 0;
     return status;
 }
