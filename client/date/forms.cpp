@@ -125,7 +125,11 @@ bool ReadPlain(std::string_view text, DateTime* value) {
     read.year = static_cast<std::int16_t>(read.year + two(2));
     read.month = two(5);
     read.day = two(8);
-    if (has_time) read.hour = two(11), read.minute = two(14), read.second = two(17);
+    if (has_time) {
+        read.hour = two(11);
+        read.minute = two(14);
+        read.second = two(17);
+    }
     if (fits) *value = read;
     return fits;
 }

@@ -137,7 +137,7 @@ private:
     std::unique_ptr<Wire> wire_;
     bool in_transaction_ = false;
     bool changed_ = false;              // by what is known of; functions of queries may have done so, too
-    bool asks_of_branches_ = false;     // by a statement that the server keeps
+    std::string branch_question_;       // the statement on the server that tells of a branch; empty: there is none yet
     struct Savepoint {
         std::string name;         // empty: a mark
         unsigned mark = 0;        // its number, which stands in the server's name for it

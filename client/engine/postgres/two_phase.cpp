@@ -120,16 +120,21 @@ Status PgConnection::KeepsPrepared(const Xid& xid, bool& kept) {
     kept = false;
     if (!home_->TwoPhase()) return {};
     Result found;
-    const std::string question = "execute kelp_branch('" + NameOf(xid) + "')";    // there are no quotes in it
-    Status status;
-    if (asks_of_branches_) status = Ask(question.c_str(), {}, found);
-    if (!asks_of_branches_ || (!status.Ok() && !Broken())) {    // the application may have dropped all statements
-        asks_of_branches_ = false;
-        status = Ask("prepare kelp_branch(text) as select 1 from pg_catalog.pg_prepared_xact() where gid = $1", {}, found);
-        if (!status.Ok()) return status;
-        asks_of_branches_ = true;
-        status = Ask(question.c_str(), {}, found);
+    const auto ask = [&] {    // there are no quotes in the name
+        return Ask(("execute " + branch_question_ + "('" + NameOf(xid) + "')").c_str(), {}, found);
+    };
+    if (!branch_question_.empty()) {
+        Status status = ask();
+        kept = status.Ok() && PQntuples(found.get()) > 0;
+        if (status.Ok() || Broken()) return status;
+        branch_question_.clear();    // the application may have dropped all statements
     }
+    const std::string name = NewName();    // another each time: who knows whether the last one is there
+    const std::string prepare = "prepare " + name + "(text) as select 1 from pg_catalog.pg_prepared_xact() where gid = $1";
+    Status status = Ask(prepare.c_str(), {}, found);
+    if (!status.Ok()) return status;
+    branch_question_ = name;
+    status = ask();
     kept = status.Ok() && PQntuples(found.get()) > 0;
     return status;
 }

@@ -58,6 +58,15 @@ protected:
         }
         return rc;
     }
+    // The piece that is wanted, of at most `length` bytes; what the fetch that takes it answers.
+    sword TakePiece(std::string& buffer, ub4& length) {
+        dvoid* handle = nullptr;
+        ub4 kind = 0, iteration = 0, index = 0;
+        ub1 direction = 0, piece = 0;
+        EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &kind, &direction, &iteration, &index, &piece)), 0);
+        EXPECT_EQ(Answer(OCIStmtSetPieceInfo(handle, kind, err, buffer.data(), &length, piece, nullptr, nullptr)), 0);
+        return FetchCode();
+    }
     // Fetches one value in pieces; the length of it, or where it is another than was put in.
     std::uint64_t TakePieces(std::string_view sql, ub2 type) {
         EXPECT_EQ(Query(sql, {InPieces(type)}, 0), 0) << sql;
@@ -65,13 +74,8 @@ protected:
         std::string buffer(kPiece - 1, '\0');
         std::uint64_t done = 0;
         while (rc == OCI_NEED_DATA) {
-            dvoid* handle = nullptr;
-            ub4 kind = 0, iteration = 0, index = 0;
-            ub1 direction = 0, piece = 0;
             auto length = static_cast<ub4>(buffer.size());
-            EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &kind, &direction, &iteration, &index, &piece)), 0);
-            EXPECT_EQ(Answer(OCIStmtSetPieceInfo(handle, kind, err, buffer.data(), &length, piece, nullptr, nullptr)), 0);
-            rc = FetchCode();
+            rc = TakePiece(buffer, length);
             if (std::string_view(buffer).substr(0, length) != endless_.At(done, length)) return done;
             done += length;
         }
@@ -150,13 +154,8 @@ TEST_F(LongValues, DoNotChangeBetweenPieces) {
     OCIStmt* const change = New<OCIStmt>(OCI_HTYPE_STMT);
     std::string buffer(kPiece, '\0');
     const auto take = [&] {
-        dvoid* handle = nullptr;
-        ub4 kind = 0, iteration = 0, index = 0;
-        ub1 direction = 0, piece = 0;
         auto length = static_cast<ub4>(buffer.size());
-        EXPECT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, &handle, &kind, &direction, &iteration, &index, &piece)), 0);
-        EXPECT_EQ(Answer(OCIStmtSetPieceInfo(handle, kind, err, buffer.data(), &length, piece, nullptr, nullptr)), 0);
-        return FetchCode();
+        return TakePiece(buffer, length);
     };
     ASSERT_EQ(Query("select c from t where k = 1 for update", {InPieces(SQLT_LBI)}, 0), 0);
     ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
