@@ -109,7 +109,10 @@ Status DisplaySize(Parameter& parameter, AttributeValue& value) {
         case SQLT_TIMESTAMP_TZ:
         case SQLT_TIMESTAMP_LTZ: value.integer = kTimestamp; break;
         case SQLT_INTERVAL_YM: value.integer = column.precision + std::uint64_t{4}; break;
-        case SQLT_INTERVAL_DS: value.integer = column.precision + std::uint64_t{10} + (column.scale > 0 ? column.scale + 1u : 0); break;
+        case SQLT_INTERVAL_DS:
+            value.integer = column.precision + std::uint64_t{10};
+            if (column.scale > 0) value.integer += static_cast<std::uint64_t>(column.scale) + 1;
+            break;
         case SQLT_RDD: value.integer = kRowId; break;
         case SQLT_BIN:
         case SQLT_LBI: value.integer = Size(column) * 2; break;
