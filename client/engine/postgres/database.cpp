@@ -5,6 +5,7 @@
 #include "engine/postgres/binary.h"
 #include "engine/postgres/connection.h"
 #include "engine/postgres/home.h"
+#include "engine/postgres/libpq.h"
 #include "engine/postgres/postgres.h"
 #include "engine/postgres/types.h"
 #include "handles/errors.h"
@@ -161,6 +162,7 @@ Status PgConnection::OpenCursor(const Datum& cursor, std::unique_ptr<Query>& que
 }
 
 Status Open(const std::string& url, std::unique_ptr<Database>& database) {
+    if (Status status = LoadLibpq(); !status.Ok()) return status;
     auto home = std::make_shared<Home>(url);
     Status status = home->Attach();
     if (status.Ok()) database = std::make_unique<PgDatabase>(std::move(home));

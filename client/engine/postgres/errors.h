@@ -1,11 +1,10 @@
 // PostgreSQL's SQLSTATEs as published error numbers, with the server's own words.
 #pragma once
 
-#include <libpq-fe.h>
-
 #include <cstdint>
 #include <string_view>
 
+#include "engine/postgres/libpq.h"
 #include "handles/status.h"
 
 namespace engine::postgres {

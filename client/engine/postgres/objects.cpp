@@ -1,6 +1,4 @@
 // Describing tables, views, sequences, schemas and the database, from the catalogue; changing passwords.
-#include <libpq-fe.h>
-
 #include <cstdlib>
 #include <string>
 #include <vector>

@@ -1,8 +1,6 @@
 // PostgreSQL's types: what a column of one is described as, how its values are read, and how values for one are written.
 #pragma once
 
-#include <libpq-fe.h>
-
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -11,6 +9,7 @@
 #include "date/interval.h"
 #include "engine/engine.h"
 #include "engine/postgres/binary.h"
+#include "engine/postgres/libpq.h"
 #include "engine/postgres/wire.h"
 
 namespace engine::postgres {

@@ -5,8 +5,6 @@
 // left. One thread at a time, Wake aside.
 #pragma once
 
-#include <libpq-fe.h>
-
 #include <chrono>
 #include <cstdint>
 #include <cstdlib>
@@ -17,6 +15,7 @@
 
 #include "engine/engine.h"
 #include "engine/postgres/errors.h"
+#include "engine/postgres/libpq.h"
 
 namespace engine::postgres {
 
