@@ -218,7 +218,8 @@ Status PgConnection::ReadTable(Oid table, Table& read) {
     Status status = AskGuarded(
         "select a.attnum::text, pg_catalog.format('%I', a.attname), a.attname, a.attnotnull::text, a.atttypmod::text,"
         " case when t.typtype = 'd' then t.typbasetype else t.oid end::text,"
-        " case when t.typnamespace = pg_catalog.to_regnamespace('kelp') then t.typname else '' end,"
+        " case when t.typnamespace = pg_catalog.to_regnamespace('kelp') or (t.typname = 'lo' and t.typbasetype = 26)"
+        " then t.typname else '' end,"
         " pg_catalog.format('%I.%I', n.nspname, c.relname), c.relkind::text from pg_catalog.pg_class c"
         " join pg_catalog.pg_namespace n on n.oid = c.relnamespace join pg_catalog.pg_attribute a on a.attrelid = c.oid"
         " join pg_catalog.pg_type t on t.oid = a.atttypid"
@@ -255,18 +256,27 @@ Status PgConnection::BaseType(Oid& type) {
     constexpr Oid kFirstMade = 16384;    // by users
     if (type < kFirstMade) return {};
     if (const auto known = base_types_.find(type); known != base_types_.end()) {
-        type = known->second;
+        type = known->second.type;
         return {};
     }
     const std::string number = std::to_string(type);
     Result result;
-    Status status = AskGuarded("select typbasetype from pg_catalog.pg_type where oid = $1::oid and typtype = 'd'",
+    Status status = AskGuarded("select typbasetype, typname from pg_catalog.pg_type where oid = $1::oid and typtype = 'd'",
                                {{number.c_str()}, {0}, {0}}, result);
     if (!status.Ok()) return status;
-    const Oid base = PQntuples(result.get()) == 1 ? Get<std::uint32_t>(PQgetvalue(result.get(), 0, 0)) : type;
+    BaseOfType base{type, false};
+    if (PQntuples(result.get()) == 1) {
+        base.type = Get<std::uint32_t>(PQgetvalue(result.get(), 0, 0));
+        base.is_object = base.type == oid::kOid && PQgetvalue(result.get(), 0, 1) == kObjectDomain;
+    }
     base_types_[type] = base;
-    type = base;
+    type = base.type;
     return {};
+}
+
+bool PgConnection::IsObjectType(Oid type) const {
+    const auto known = base_types_.find(type);
+    return known != base_types_.end() && known->second.is_object;
 }
 
 // ---- Transactions

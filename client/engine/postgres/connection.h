@@ -25,7 +25,7 @@ class PgQuery;
 // A table or view as it was when it was first asked for.
 struct TableColumn {
     std::string name;       // as it stands in SQL; empty: there is none of that number
-    std::string domain;     // of its type, where that is one of the schema kelp
+    std::string domain;     // of its type, where that is one of the schema kelp, or of large objects
     Column described;
 };
 struct Table {
@@ -77,6 +77,8 @@ public:
     Status TableOf(Oid table, std::shared_ptr<const Table>& known);
     // The type that a domain is of; any other type as it is.
     Status BaseType(Oid& type);
+    // Whether one that was asked about so is of the server's large objects.
+    [[nodiscard]] bool IsObjectType(Oid type) const;
     [[nodiscard]] PgLobStore& Large() { return *lobs_; }
     // Makes way for something else: has the query whose rows still come read them ahead, and forgets what closed queries
     // have left with the server. 3114 on a broken connection.
@@ -147,7 +149,11 @@ private:
     std::vector<std::string> forgotten_;     // commands that end prepared statements which nobody has any more
     std::uint64_t names_ = 0;
     std::map<Oid, std::shared_ptr<const Table>> tables_;
-    std::map<Oid, Oid> base_types_;
+    struct BaseOfType {
+        Oid type;
+        bool is_object;
+    };
+    std::map<Oid, BaseOfType> base_types_;
     std::unique_ptr<PgLobStore> lobs_;
     // The schema that is looked in first, in double quotes where it needs them; null: none but the user's own path.
     std::shared_ptr<const std::string> schema_;

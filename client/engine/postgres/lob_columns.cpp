@@ -11,15 +11,6 @@
 namespace engine::postgres {
 namespace {
 
-// What quotes in ways of the server's own is left alone.
-bool QuotesOtherwise(std::string_view sql) {
-    if (sql.find('\\') != std::string_view::npos) return true;
-    for (std::size_t at = sql.find('$'); at != std::string_view::npos; at = sql.find('$', at + 1)) {
-        if (at + 1 == sql.size() || !std::isdigit(static_cast<unsigned char>(sql[at + 1]))) return true;
-    }
-    return false;
-}
-
 // Where the list of columns ends.
 std::optional<std::size_t> EndOfList(std::string_view sql, std::size_t& end_of_text) {
     if (QuotesOtherwise(sql)) return {};
@@ -38,10 +29,20 @@ std::string ItemName(std::size_t index) { return "kelp_" + std::to_string(index 
 
 }  // namespace
 
+bool QuotesOtherwise(std::string_view sql) {
+    if (sql.find('\\') != std::string_view::npos) return true;
+    for (std::size_t at = sql.find('$'); at != std::string_view::npos; at = sql.find('$', at + 1)) {
+        if (at + 1 == sql.size() || !std::isdigit(static_cast<unsigned char>(sql[at + 1]))) return true;
+    }
+    return false;
+}
+
 std::shared_ptr<const LobColumn> LobColumnOf(const Table& table, std::size_t number, const Column& column) {
-    if (!table.has_rows || !IsLob(column)) return nullptr;
+    const TableColumn& known = table.columns[number];
+    const bool is_object = known.domain == kObjectDomain;
+    if (!IsLob(column) || !(table.has_rows || is_object)) return nullptr;
     const LobKind kind = column.type == SQLT_BLOB ? LobKind::bytes : LobKind::characters;
-    return std::make_shared<LobColumn>(LobColumn{kind, table.columns[number].name});
+    return std::make_shared<LobColumn>(LobColumn{kind, known.name, is_object});
 }
 
 std::string BytesOf(const LobColumn& column, std::string_view value) {
@@ -49,7 +50,8 @@ std::string BytesOf(const LobColumn& column, std::string_view value) {
     return "pg_catalog.textsend(" + std::string(value) + ")";    // in the session's character set, which is UTF-8
 }
 
-std::string LengthOf(const LobColumn& column, std::string_view value, bool server_has_utf8) {
+std::string MeasureOf(const LobColumn& column, std::string_view value, bool server_has_utf8) {
+    if (column.is_object) return std::string(value);
     const bool as_it_is = column.kind == LobKind::bytes || server_has_utf8;    // tells without reading it
     return "pg_catalog.octet_length(" + (as_it_is ? std::string(value) : BytesOf(column, value)) + ")";
 }
@@ -59,7 +61,7 @@ std::string WithPlaces(std::string_view sql, std::size_t columns, const std::vec
     std::size_t end = 0;
     const std::optional<std::size_t> list = EndOfList(sql, end);
     if (!list) return {};
-    std::string names, wanted, lengths;
+    std::string names, wanted, measures;
     for (std::size_t index = 0; index < columns; ++index) {
         const std::string name = ItemName(index);
         names += name + ", ";
@@ -69,13 +71,14 @@ std::string WithPlaces(std::string_view sql, std::size_t columns, const std::vec
             wanted += name;
             continue;
         }
-        const std::string length = LengthOf(*item->column, name, server_has_utf8);
-        wanted += "case when " + length + " <= " + std::to_string(kLongestInline) + " then " + name + " end";
-        lengths += ", " + length + "::bigint";
+        const std::string measure = MeasureOf(*item->column, name, server_has_utf8);
+        measures += ", " + measure + "::bigint";
+        if (item->column->is_object) wanted += name;
+        else wanted += "case when " + measure + " <= " + std::to_string(kLongestInline) + " then " + name + " end";
     }
     std::string text = "with kelp_q(" + names + "kelp_table, kelp_place, kelp_transaction) as (";
     text.append(sql.substr(0, *list)).append(", tableoid, ctid, xmin").append(sql.substr(*list, end - *list));
-    return text + "\n) select " + wanted + lengths +
+    return text + "\n) select " + wanted + measures +
            ", kelp_table::bigint, kelp_place, kelp_transaction::text::bigint from kelp_q";
 }
 

@@ -6,6 +6,8 @@
 #include <new>
 #include <span>
 
+#include "engine/postgres/object_lob.h"
+#include "engine/postgres/question.h"
 #include "engine/postgres/types.h"
 #include "engine/temporary_lob.h"
 #include "handles/errors.h"
@@ -24,24 +26,6 @@ std::string PlaceText(const RowVersion& version) {
     return "(" + std::to_string(version.place >> 16) + "," + std::to_string(version.place & 0xFFFF) + ")";
 }
 
-// Texts, and bytes, as the values of a question. The strings stay where they are.
-struct Question {
-    std::vector<std::string> texts;
-    Wire::Values values;
-    explicit Question(std::vector<std::string> words) : texts(std::move(words)) {
-        for (const std::string& text : texts) Add(text, false);
-    }
-    void Add(std::string_view value, bool binary) {
-        values.data.push_back(value.data() ? value.data() : "");
-        values.lengths.push_back(static_cast<int>(value.size()));
-        values.formats.push_back(binary);
-    }
-};
-
-std::string_view Field(const Result& result, int row, int column) {
-    return {PQgetvalue(result.get(), row, column), static_cast<std::size_t>(PQgetlength(result.get(), row, column))};
-}
-
 // Of columns "ctid, xmin::text::bigint".
 RowVersion VersionIn(const Result& result, int row, int column, Oid table) {
     const char* const place = PQgetvalue(result.get(), row, column);
@@ -53,14 +37,12 @@ RowVersion VersionIn(const Result& result, int row, int column, Oid table) {
 
 // ---- The object of a column
 
-class ColumnLob final : public Lob {
+class ColumnLob final : public RowLob {
 public:
-    ColumnLob(PgLobStore& store, const LobView& view)
-        : shared_(store.shared_), column_(*view.column), version_(view.version), length_(view.length),
-          seen_at_(view.seen_at) {}
+    ColumnLob(PgLobStore& store, const LobView& view) : RowLob(store, view), length_(view.length) {}
 
-    [[nodiscard]] LobKind Kind() const override { return column_->kind; }
-    [[nodiscard]] bool IsTemporary() const override { return false; }
+    // The bytes that came with the row; `brief`: they stay where they are.
+    Status TakeWhole(std::span<const std::byte> whole, bool brief);
     [[nodiscard]] bool IsSame(const Lob& other) const override {
         const auto* column = dynamic_cast<const ColumnLob*>(&other);
         return column && row_ && column->shared_ == shared_ && column->row_ == row_ &&
@@ -71,31 +53,22 @@ public:
     }
     Status Length(std::uint64_t& bytes) override;
     Status Read(std::uint64_t offset, std::span<std::byte> out, std::size_t& read) override;
-    Status CheckWrite() override;
     Status Write(std::uint64_t offset, std::span<const std::byte> in) override;
     Status Trim(std::uint64_t bytes) override;
 
 private:
-    friend class PgLobStore;
     // Where it is read: one of them at most.
     struct Place {
         Lob* draft = nullptr;
         bool whole = false;     // in whole_ or copy_
     };
+    Status CheckRead() override;
     Status Find(Place& place);
     Status Refresh(bool follows);
     Status Draft(Lob*& draft);
     Status ReadWindow(std::uint64_t offset, std::size_t wanted);
-    [[nodiscard]] PgLobStore& Store() const { return *shared_->store; }
 
-    const std::shared_ptr<PgLobStore::Shared> shared_;
-    const std::shared_ptr<const LobColumn> column_;
-    std::shared_ptr<LobRow> row_;          // null of one that is brief
-    RowVersion version_;                   // that it reads
-    std::uint64_t length_;                 // of that version
-    std::uint64_t seen_at_;                // when it was the row's
-    std::uint64_t transaction_ = 0;        // it was fetched in; 0: none
-    bool is_current_ = false;              // what the row holds now counts, not that version
+    std::uint64_t length_;                 // of its version
     std::span<const std::byte> whole_;     // all of that version: the row's own
     std::unique_ptr<ChunkedBytes> copy_;   // or a copy
     bool is_whole_ = false;                // either is there
@@ -103,10 +76,18 @@ private:
     std::uint64_t window_at_ = 0;
 };
 
+Status ColumnLob::TakeWhole(std::span<const std::byte> whole, bool brief) {
+    is_whole_ = true;
+    whole_ = whole;
+    if (brief) return {};
+    copy_ = std::make_unique<ChunkedBytes>(Store().file_, FillerOf(Kind()));
+    return copy_->Write(0, whole);
+}
+
 // Whether it can be read, and where. The row's last version is looked for when a statement has run since.
 Status ColumnLob::Find(Place& place) {
     if (!shared_->store) return Error(errors::kInvalidLocator);
-    const bool in_transaction = is_current_ && Store().InTransaction(transaction_);
+    const bool in_transaction = is_current_ && InItsTransaction();
     if (in_transaction) place.draft = Store().FindDraft(*row_, *column_);
     if (place.draft) return {};
     if (is_current_ && seen_at_ != Store().now_) {
@@ -116,19 +97,22 @@ Status ColumnLob::Find(Place& place) {
     return {};
 }
 
+Status ColumnLob::CheckRead() {
+    Place place;
+    return Find(place);
+}
+
 // What the row holds now; once the transaction is over, as long as nobody else has changed it.
 Status ColumnLob::Refresh(bool follows) {
-    RowVersion latest = row_->versions.back();
+    RowVersion latest;
     std::uint64_t length = 0;
-    if (Status status = Store().FindLatest(*column_, *row_, follows, latest, length); status.Failed()) return status;
-    Store().Follow(row_, latest);
+    if (Status status = FindLatest(follows, latest, length); status.Failed()) return status;
     if (latest != version_) {
         is_whole_ = false;
         window_.clear();
     }
     version_ = latest;
     length_ = length;
-    seen_at_ = row_->checked_at = Store().now_;
     return {};
 }
 
@@ -182,18 +166,6 @@ Status ColumnLob::ReadWindow(std::uint64_t offset, std::size_t wanted) {
     return {};
 }
 
-// A row that the transaction has written is its own, however it was fetched.
-Status ColumnLob::CheckWrite() {
-    if (!shared_->store) return Error(errors::kInvalidLocator);
-    if (!is_current_ && row_ && Store().InTransaction(transaction_)) {
-        if (Status status = Store().HasWritten(version_, is_current_); status.Failed()) return status;
-    }
-    if (!is_current_) return Refused(errors::kRowNotLocked);
-    if (!Store().InTransaction(transaction_)) return Refused(errors::kLocatorOfOldTransaction);
-    Place place;
-    return Find(place);
-}
-
 // The draft of the value, which is made when there is none.
 Status ColumnLob::Draft(Lob*& draft) {
     draft = Store().FindDraft(*row_, *column_);
@@ -241,25 +213,23 @@ Status PgLobStore::CreateTemporary(LobKind kind, std::shared_ptr<Lob>& lob) {
 Status PgLobStore::Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob) {
     LobView view;
     std::memcpy(&view, value.data, sizeof view);
+    if ((*view.column)->is_object) {
+        auto made = std::make_shared<ObjectLob>(*this, view);
+        if (!brief) made->Keep(view);
+        lob = std::move(made);
+        return {};
+    }
     auto made = std::make_shared<ColumnLob>(*this, view);
-    if (connection_.InTransaction()) made->transaction_ = transaction_;
-    made->is_whole_ = view.is_whole;
-    const std::span whole(static_cast<const std::byte*>(value.data) + sizeof view,
-                          static_cast<std::size_t>(view.is_whole ? view.length : 0));
-    if (brief) {
-        made->whole_ = whole;
-    } else {
-        made->row_ = RowOf(view.version);
-        made->row_->checked_at = std::max(made->row_->checked_at, view.seen_at);
-        made->is_current_ = connection_.InTransaction() && view.is_locked;
-        if (view.is_whole) {
-            made->copy_ = std::make_unique<ChunkedBytes>(file_, FillerOf(made->Kind()));
-            if (Status status = made->copy_->Write(0, whole); status.Failed()) return status;
-        }
+    if (!brief) made->Keep(view);
+    if (view.is_whole) {
+        const std::span whole(static_cast<const std::byte*>(value.data) + sizeof view, static_cast<std::size_t>(view.length));
+        if (Status status = made->TakeWhole(whole, brief); status.Failed()) return status;
     }
     lob = std::move(made);
     return {};
 }
+
+std::uint64_t PgLobStore::OpenTransaction() const { return connection_.InTransaction() ? transaction_ : 0; }
 
 bool PgLobStore::InTransaction(std::uint64_t number) const {
     return number != 0 && number == transaction_ && connection_.InTransaction();
@@ -329,7 +299,7 @@ Status PgLobStore::WhyMissing(const RowVersion& version) {
 // Updates by the transaction are followed from the versions that are known. Behind an undoing only those that are known
 // count: places that it has freed may be others' by now.
 Status PgLobStore::FindLatest(const LobColumn& column, const LobRow& row, bool follows, RowVersion& latest,
-                              std::uint64_t& length) {
+                              std::uint64_t& measure) {
     const Oid oid = latest.table;
     std::shared_ptr<const Table> table;
     if (Status status = connection_.TableOf(oid, table); !status.Ok()) return status;
@@ -338,7 +308,7 @@ Status PgLobStore::FindLatest(const LobColumn& column, const LobRow& row, bool f
     const Question question({"{" + places + "}", table->name});
     const std::string sql =
         "with kelp_v(place) as (select pg_catalog.unnest($1::tid[])) select ctid, xmin::text::bigint, " +
-        LengthOf(column, column.name, connection_.Server().ServerHasUtf8()) + "::bigint from only " + table->name +
+        MeasureOf(column, column.name, connection_.Server().ServerHasUtf8()) + "::bigint from only " + table->name +
         " where ctid = any(array(select place from kelp_v union select pg_catalog.currtid2($2::text, place) from kelp_v))";
     Result found;
     Status status = connection_.AskGuarded(sql, question.values, found);
@@ -349,11 +319,11 @@ Status PgLobStore::FindLatest(const LobColumn& column, const LobRow& row, bool f
         const bool is_known = std::find(row.versions.begin(), row.versions.end(), version) != row.versions.end();
         (is_known ? fits : next) = index;
     }
-    if (fits < 0 && follows && row.checked_at > undone_at_) fits = next;
+    if (fits < 0 && follows && row.checked_at >= undone_at_) fits = next;
     if (fits < 0) return Refused(next < 0 ? errors::kNoLobValue : errors::kSnapshotTooOld);
     if (PQgetisnull(found.get(), fits, 2)) return Refused(errors::kNoLobValue);
     latest = VersionIn(found, fits, 0, oid);
-    length = static_cast<std::uint64_t>(Get<std::int64_t>(PQgetvalue(found.get(), fits, 2)));
+    measure = static_cast<std::uint64_t>(Get<std::int64_t>(PQgetvalue(found.get(), fits, 2)));
     return {};
 }
 

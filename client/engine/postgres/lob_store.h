@@ -3,7 +3,7 @@
 // that can no longer be seen is refused. A value that the transaction has locked is what its row holds now: the versions
 // that the row gets are followed. What is written is collected in a draft, outside of the server, which becomes the
 // column's value (one update) before anything could see it: before the next statement of the connection, a mark, or the
-// commit.
+// commit. Columns that hold the numbers of large objects of the server have no drafts: object_lob.h.
 #pragma once
 
 #include <cstdint>
@@ -41,9 +41,10 @@ struct LobRow {
 // The value of a Datum of Kind::lob; the bytes follow where they came with the row.
 struct LobView {
     const std::shared_ptr<const LobColumn>* column = nullptr;
-    RowVersion version;
+    RowVersion version;          // of table 0: of no row that is known
     bool is_locked = false;      // by the statement that brings it
     bool is_whole = false;       // its bytes follow
+    Oid object = 0;              // the number of one that the server keeps for itself, which has no length here
     std::uint64_t length = 0;
     std::uint64_t seen_at = 0;
 };
@@ -65,11 +66,16 @@ public:
     // Drafts become values. The values of drafts that fail stay as they were; where memory failed, the drafts wait.
     Status Settle();
     void Forget() noexcept;                 // the drafts: what they are of is undone, or part of it
-    void Undone() noexcept { undone_at_ = ++now_; }    // some of the transaction, not its drafts
+    void Undone() noexcept {                // some of the transaction, not its drafts
+        undone_at_ = ++now_;
+        ++object_changes_;
+    }
     void TransactionBegins() noexcept { ++transaction_; }
 
 private:
+    friend class RowLob;
     friend class ColumnLob;
+    friend class ObjectLob;
     struct Draft {
         std::shared_ptr<LobRow> row;
         std::shared_ptr<const LobColumn> column;
@@ -92,10 +98,11 @@ private:
                        Result& found);
     // `follows`: a version that is not known is one if it has come of those that are.
     Status FindLatest(const LobColumn& column, const LobRow& row, bool follows, RowVersion& latest,
-                      std::uint64_t& length);
+                      std::uint64_t& measure);
     Status HasWritten(const RowVersion& version, bool& written);
     Status WhyMissing(const RowVersion& version);
     [[nodiscard]] bool InTransaction(std::uint64_t number) const;
+    [[nodiscard]] std::uint64_t OpenTransaction() const;    // its number; 0: there is none
 
     PgConnection& connection_;
     const std::shared_ptr<ChunkFile> file_ = std::make_shared<ChunkFile>();
@@ -106,6 +113,7 @@ private:
     std::uint64_t transaction_ = 0;       // the number of the one that runs, or ran last
     std::uint64_t now_ = 1;
     std::uint64_t writes_ = 0;            // into drafts
+    std::uint64_t object_changes_ = 0;    // of objects that the server keeps for itself: writes, and what undid them
     std::uint64_t undone_at_ = 0;
 };
 

@@ -62,7 +62,8 @@ PgQuery::PgQuery(PgConnection& connection, const StatementSource& source)
       sql_(source.sql),
       effect_(source.effect),
       verb_(VerbOf(sql_)),
-      kinds_(source.parameters.begin(), source.parameters.end()) {
+      kinds_(source.parameters.begin(), source.parameters.end()),
+      text_(sql_) {
     if (effect_ == Effect::controls) savepoint_ = PgConnection::ReadSavepoint(sql_);
 }
 
@@ -108,29 +109,36 @@ Status PgQuery::Prepare(std::uint32_t& error_offset) {
     return status.Ok() && !lobs_.empty() ? PrepareLobs() : status;
 }
 
-// A list with large objects is asked for with the places of its rows, where the server can tell them.
+// A list with large objects is asked for with the places of its rows, where the server can tell them. Without them only
+// those come that the server keeps for themselves.
 Status PgQuery::PrepareLobs() {
-    const std::string text = WithPlaces(sql_, columns_.size(), lobs_, connection_.Server().ServerHasUtf8());
+    const std::string text = WithPlaces(text_, columns_.size(), lobs_, connection_.Server().ServerHasUtf8());
     Result description;
     std::uint32_t offset = 0;
     std::string name = connection_.NewName();
     const auto fields = static_cast<int>(columns_.size() + lobs_.size() + kFieldsOfPlace);
     Status status = text.empty() ? Refused(errors::kUnsupported) : SendPrepared(name, text, bound_.Types(), description, offset);
     if (connection_.Broken()) return status;
-    if (status.Ok() && PQnfields(description.get()) == fields) {
-        connection_.Forget(std::exchange(name_, std::move(name)));
-        at_hand_.lobs.resize(lobs_.size());
-        return {};
-    }
-    if (status.Ok()) connection_.Forget(name);
-    lobs_.clear();
+    has_places_ = status.Ok() && PQnfields(description.get()) == fields;
+    if (has_places_) connection_.Forget(std::exchange(name_, std::move(name)));
+    else if (status.Ok()) connection_.Forget(name);
+    if (!has_places_) std::erase_if(lobs_, [](const LobItem& item) { return !item.column->is_object; });
+    at_hand_.lobs.resize(lobs_.size());
     return {};
 }
 
-Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
+std::vector<Oid> PgQuery::DeclaredTypes() const {
     std::vector<Oid> types;
     for (const Kind kind : kinds_) types.push_back(TypeOf(kind));
-    Status status = PrepareAs(types, error_offset);
+    return types;
+}
+
+Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
+    std::vector<Oid> types = DeclaredTypes();
+    text_ = sql_;
+    makes_object_.clear();
+    Status status = PrepareForObjects(PrepareAs(types, error_offset), error_offset);
+    if (connection_.Broken()) return status;
     if (status.Number() == errors::kInconsistentTypes) {    // a type that nothing tells
         std::vector<Oid> told = types;
         for (std::size_t index = 0; index < told.size(); ++index) {
@@ -151,7 +159,7 @@ Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_of
     name_.clear();
     std::string name = connection_.NewName();
     Result description;
-    Status status = SendPrepared(name, sql_ + std::string(tail_), types, description, error_offset);
+    Status status = SendPrepared(name, text_ + std::string(tail_), types, description, error_offset);
     if (!status.Ok()) return status;
     name_ = std::move(name);
     return Describe(description.get());
@@ -195,6 +203,7 @@ Status PgQuery::Describe(const PGresult* result) {
 Status PgQuery::DescribeColumns(const PGresult* result) {
     const int count = tail_.empty() ? PQnfields(result) : 0;
     lobs_.clear();
+    has_places_ = false;
     columns_.assign(static_cast<std::size_t>(count), {});
     at_hand_.rooms.resize(columns_.size());
     at_hand_.values.resize(columns_.size());

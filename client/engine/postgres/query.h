@@ -58,6 +58,10 @@ private:
     };
 
     Status PrepareTyped(std::uint32_t& error_offset);
+    Status PrepareForObjects(Status status, std::uint32_t& error_offset);
+    [[nodiscard]] bool GivesTextsToObjects() const;
+    Status FindObjects(bool& found);
+    [[nodiscard]] std::vector<Oid> DeclaredTypes() const;
     Status PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset);
     Status SendPrepared(const std::string& name, const std::string& text, const std::vector<Oid>& types,
                         Result& description, std::uint32_t& error_offset);
@@ -101,6 +105,8 @@ private:
     void Hold();
     Status Fill(const PGresult* result, int row);
     Status FillLobs(const PGresult* result, int row);
+    Status FindPlace(const PGresult* result, int row, RowVersion& version);
+    bool ReadField(const PGresult* result, int row, int field, Oid type, ValueRoom& room, Datum& value) const;
 
     PgConnection& connection_;
     const std::string sql_;
@@ -108,6 +114,8 @@ private:
     const Verb verb_;
     const std::vector<Kind> kinds_;
     PgConnection::SavepointCommand savepoint_;
+    std::string text_;                     // the statement, with values that become large objects of the server
+    std::vector<bool> makes_object_;       // by placeholder; shorter or empty: the others do not
     std::string_view tail_;                // what the server is told behind the statement
     std::string name_;                     // empty: the server has it not
     BoundValues bound_;
@@ -117,7 +125,8 @@ private:
     std::vector<std::string> arrays_;
     std::vector<Column> columns_;
     std::vector<Reader> readers_;
-    std::vector<LobItem> lobs_;            // columns whose rows' places come behind the others
+    std::vector<LobItem> lobs_;            // columns of large objects
+    bool has_places_ = false;              // the places of their rows come behind the others
     // The row at hand: its values, and what they show beside the result.
     struct RowAtHand {
         std::vector<Datum> values;

@@ -4,6 +4,7 @@
 #include <new>
 
 #include "engine/postgres/query.h"
+#include "engine/postgres/query_objects.h"
 #include "handles/errors.h"
 
 namespace engine::postgres {
@@ -76,13 +77,19 @@ bool PgQuery::MakeWhole() {
     const std::size_t values = lower.find("values");
     if (!InsertsRows() || types.empty() || types.size() != kinds_.size()) return false;
     if (!IsPlaceholdersAlone(std::string_view(sql_).substr(values + 6), types.size())) return false;
-    std::string text = sql_.substr(0, values) + "select * from unnest(";
+    std::string given, columns, arrays;
     for (std::size_t index = 0; index < types.size(); ++index) {
         const ElementRow* element = ElementOf(types[index], kinds_[index]);
         if (!element) return false;
-        text += (index > 0 ? ", $" : "$") + std::to_string(index + 1) + "::" + element->array;
+        const std::string_view comma = index > 0 ? ", " : "";
+        const std::string name = "kelp_" + std::to_string(index + 1);
+        const bool makes_object = index < makes_object_.size() && makes_object_[index];
+        given.append(comma).append(makes_object ? NewObject(name) : name);
+        columns.append(comma).append(name);
+        arrays.append(comma).append("$" + std::to_string(index + 1) + "::" + element->array);
     }
-    text += ')';
+    const std::string text =
+        sql_.substr(0, values) + "select " + given + " from unnest(" + arrays + ") as kelp_a(" + columns + ")";
     std::string name = connection_.NewName();
     Wire& server = connection_.Server();
     const PgConnection::Guard guard = connection_.SendGuard(false);

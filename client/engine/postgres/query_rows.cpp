@@ -258,7 +258,7 @@ void PgQuery::Close() noexcept {
 // A row as views of the result, or of the rooms.
 Status PgQuery::Fill(const PGresult* result, int row) {
     const int count = static_cast<int>(at_hand_.values.size());
-    const auto places = static_cast<int>(lobs_.empty() ? 0 : lobs_.size() + 3);
+    const auto places = static_cast<int>(has_places_ ? lobs_.size() + 3 : 0);
     if (PQnfields(result) != count + places) return Refused(errors::kSchemaChanged);
     for (int index = 0; index < count; ++index) {
         const auto place = static_cast<std::size_t>(index);
@@ -274,38 +274,50 @@ Status PgQuery::Fill(const PGresult* result, int row) {
     return lobs_.empty() ? Status() : FillLobs(result, row);
 }
 
-// Behind the columns stand the lengths of the large objects, then the row's table, place and transaction.
-Status PgQuery::FillLobs(const PGresult* result, int row) {
-    const auto first = static_cast<int>(at_hand_.values.size());
-    const int version = first + static_cast<int>(lobs_.size());
-    const auto read = [&](int field, Oid type, ValueRoom& room, Datum& value) {
-        const std::string_view bytes(PQgetvalue(result, row, field), static_cast<std::size_t>(PQgetlength(result, row, field)));
-        return (binary_ ? BinaryReader(type) : TextReader(type))(bytes, room, value);
-    };
+// Of the row at hand: behind the columns and the lengths of large objects stand its table, place and transaction.
+Status PgQuery::FindPlace(const PGresult* result, int row, RowVersion& version) {
+    const auto first = static_cast<int>(at_hand_.values.size() + lobs_.size());
     ValueRoom room;
-    Datum table, place, transaction, length;
-    if (PQgetisnull(result, row, version + 1) || read(version, oid::kInt8, room, table) != 0 ||
-        read(version + 2, oid::kInt8, room, transaction) != 0 || read(version + 1, oid::kTupleId, room, place) != 0)
+    Datum table, place, transaction;
+    if (PQgetisnull(result, row, first + 1) || !ReadField(result, row, first, oid::kInt8, room, table) ||
+        !ReadField(result, row, first + 2, oid::kInt8, room, transaction) ||
+        !ReadField(result, row, first + 1, oid::kTupleId, room, place))
         return Refused(errors::kInternalError, "a row without a place");
     char tuple[kTupleIdSize];
     TupleIdOf(place.Row(), tuple);
+    version = {static_cast<Oid>(table.integer), static_cast<std::uint32_t>(transaction.integer),
+               std::uint64_t{Get<std::uint32_t>(tuple)} << 16 | Get<std::uint16_t>(tuple + 4)};
+    return {};
+}
+
+bool PgQuery::ReadField(const PGresult* result, int row, int field, Oid type, ValueRoom& room, Datum& value) const {
+    const std::string_view bytes(PQgetvalue(result, row, field), static_cast<std::size_t>(PQgetlength(result, row, field)));
+    return (binary_ ? BinaryReader(type) : TextReader(type))(bytes, room, value) == 0;
+}
+
+// Values of large objects become views of them. Without places only those come that the server keeps for themselves.
+Status PgQuery::FillLobs(const PGresult* result, int row) {
     LobView view;
-    view.version = {static_cast<Oid>(table.integer), static_cast<std::uint32_t>(transaction.integer),
-                    std::uint64_t{Get<std::uint32_t>(tuple)} << 16 | Get<std::uint16_t>(tuple + 4)};
+    if (has_places_) {
+        if (Status status = FindPlace(result, row, view.version); !status.Ok()) return status;
+    }
     view.is_locked = effect_ == Effect::locks || effect_ == Effect::changes;
     view.seen_at = connection_.Large().Now();
     for (std::size_t index = 0; index < lobs_.size(); ++index) {
         Datum& value = at_hand_.values[lobs_[index].index];
-        const int field = first + static_cast<int>(index);
-        if (PQgetisnull(result, row, field)) {
+        const int field = static_cast<int>(at_hand_.values.size() + index);
+        const bool is_object = lobs_[index].column->is_object;
+        if (is_object ? value.kind == Kind::null : PQgetisnull(result, row, field)) {
             value = {};
             continue;
         }
-        ValueRoom number;
-        if (const int error = read(field, oid::kInt8, number, length)) return Refused(error);
+        ValueRoom room;
+        Datum length;
+        view.object = is_object ? static_cast<Oid>(value.integer) : 0;
+        if (!is_object && !ReadField(result, row, field, oid::kInt8, room, length)) return Refused(errors::kInternalError);
         view.column = &lobs_[index].column;
         view.length = static_cast<std::uint64_t>(length.integer);
-        view.is_whole = value.kind != Kind::null && value.length == view.length;
+        view.is_whole = !is_object && value.kind != Kind::null && value.length == view.length;
         std::string& bytes = at_hand_.lobs[index];
         bytes.assign(reinterpret_cast<const char*>(&view), sizeof view);
         if (view.is_whole) bytes.append(value.Text());

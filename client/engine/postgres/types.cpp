@@ -333,6 +333,7 @@ void DescribeColumn(Oid type, int modifier, std::string_view domain, Column& col
         {oid::kBytes, "raw", SQLT_BIN, 0, false},
         {oid::kBytes, "long_raw", SQLT_LBI, 0, false},
         {oid::kBytes, "", SQLT_BLOB, kLocatorSize, false},
+        {oid::kOid, kObjectDomain, SQLT_BLOB, kLocatorSize, false},
     };
     DescribeType(type, modifier, column);
     if (type == oid::kInterval && domain == "year_month") return DescribeSpan(SQLT_INTERVAL_YM, 0, column);
@@ -383,8 +384,14 @@ Reader IntervalReader(const Column& column, bool binary) {
     return ReaderOfDigits(column.scale, binary, std::make_integer_sequence<int, kMostFraction + 1>());
 }
 
-Reader WholeBinaryReader(Oid type) { return type == oid::kBytes ? ReadWhole<Kind::bytes> : ReadWhole<Kind::text>; }
-Reader WholeTextReader(Oid type) { return type == oid::kBytes ? TextToWholeBytes : ReadWhole<Kind::text>; }
+Reader WholeBinaryReader(Oid type) {
+    if (type == oid::kOid) return BinaryReader(type);
+    return type == oid::kBytes ? ReadWhole<Kind::bytes> : ReadWhole<Kind::text>;
+}
+Reader WholeTextReader(Oid type) {
+    if (type == oid::kOid) return TextReader(type);
+    return type == oid::kBytes ? TextToWholeBytes : ReadWhole<Kind::text>;
+}
 
 bool IsTextType(Oid type) {
     return type == oid::kText || type == kVarying || type == kFixed || type == kName || type == kUnknown;

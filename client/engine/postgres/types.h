@@ -22,7 +22,10 @@ constexpr Oid kInterval = 1186, kNumeric = 1700, kCursor = 1790;
 
 // A column's type, size and numbers by type and modifier; name and nullability are left alone.
 void DescribeType(Oid type, int modifier, Column& column);
-// The same of a column of a table or view: `domain` is the name of its type where that is one of the schema kelp.
+// A domain of that name over oid, in any schema, is of the server's large objects.
+constexpr std::string_view kObjectDomain = "lo";
+// The same of a column of a table or view: `domain` is the name of its type where that is one of the schema kelp, or the
+// domain of large objects.
 void DescribeColumn(Oid type, int modifier, std::string_view domain, Column& column);
 bool IsLob(const Column& column);
 // A name as the application sees it, and the other way round: all of it in the other letter case, unless it has both. What
@@ -43,7 +46,7 @@ union ValueRoom {
 using Reader = int (*)(std::string_view bytes, ValueRoom& room, Datum& value);
 Reader BinaryReader(Oid type);    // null: the type is read as text
 Reader TextReader(Oid type);
-// The same of texts and bytes, but an empty one is no null.
+// The same of large objects' columns: an empty text is no null; of one of the server's the number.
 Reader WholeBinaryReader(Oid type);
 Reader WholeTextReader(Oid type);
 // The same of a column of intervals, which says of which span they are; null for any other column.

@@ -1055,6 +1055,109 @@ TEST_P(LobContract, TemporaryOneOutlivesTransactionsAndConnection) {
     EXPECT_TRUE(lob->IsTemporary());
 }
 
+// Those that a server keeps for themselves, by numbers in a column: read and written in place, seen as they are now.
+class ServerObjects : public LobContract {
+protected:
+    void SetUp() override {
+        LobContract::SetUp();
+        MustCommit("create domain lo as oid", "create table o(k integer, c lo, b bytea)",
+                   "insert into o values(1, lo_from_bytea(0, 'one'), 'x'), (2, null, null), (3, lo_from_bytea(0, 'three'), 'y')");
+    }
+    std::string Bytes(const char* of = "select k, convert_from(lo_get(c), 'UTF8') from o where c is not null order by k") {
+        return Query(of);
+    }
+};
+
+TEST_P(ServerObjects, AreWrittenWhereTheyLie) {
+    EXPECT_EQ(Opened("select c from o")->Columns()[0].type, SQLT_BLOB);
+    EXPECT_EQ(Write(*Plain("select c from o where k = 3"), 0, "x"), 22920);
+    EXPECT_EQ(Write(*Plain("select o.c from o, l where o.k = 3"), 0, "x"), 22920);
+    const Kept lob = Locked("select c from o where k = 3");
+    ASSERT_EQ(Write(*lob, 0, "TH"), 0);
+    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    ASSERT_EQ(Write(*lob, 7, " more"), 0);                     // behind a gap
+    EXPECT_EQ(Read(*lob), std::string("THree\0\0 more", 12));
+    EXPECT_EQ(Read(*lob, 3) + Read(*lob, 12) + Read(*lob, 1'000'000), std::string("ee\0\0 more", 9));
+    ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
+    EXPECT_EQ(Read(*lob), "THree");
+    ASSERT_EQ(Answer(lob->Trim(4)), 0);
+    EXPECT_EQ(Bytes(), "1,one;3,THre;");
+    MustRun("update o set c = lo_from_bytea(0, 'new'), k = 4 where k = 3");
+    EXPECT_EQ(Read(*lob), "new");                              // what the row holds now
+    ASSERT_EQ(Write(*lob, 3, "er"), 0);
+    EXPECT_EQ(Bytes(), "1,one;4,newer;");
+    EXPECT_TRUE(lob->IsSame(*Plain("select c from o where k = 4")));
+    EXPECT_FALSE(lob->IsSame(*Plain("select c from o where k = 1")));
+    const Kept returned = Fetch(*connection_, "delete from o where k = 4 returning c", Effect::changes);
+    EXPECT_EQ(Read(*lob), "error 22922");
+    EXPECT_EQ(Write(*lob, 0, "x"), 22922);
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(Write(*lob, 0, "x"), 22990);
+    EXPECT_EQ(Read(*Plain("select c from o where k = 3")), "three");
+}
+
+TEST_P(ServerObjects, AreReadAsTheyAreNow) {
+    const Kept lists[] = {Plain("select c from o where k = 3"), Plain("select o.c from o, l where o.k = 3"),
+                          Plain("select distinct c from o where k = 3")};
+    const auto query = Opened("select c, k, b from o where k <> 2 order by k");
+    Taking rows(*connection_->Lobs());
+    bool more = true;
+    ASSERT_EQ(Answer(query->Fetch(rows, 1, more)), 0);
+    const auto other = Connect();
+    ASSERT_EQ(Run(*other, "select lo_put(c, 0, 'T') from o where k = 3"), 0);
+    for (const auto& lob : lists) {
+        ASSERT_NE(lob, nullptr);
+        EXPECT_EQ(Read(*lob) + Read(*lob), "ThreeThree");
+    }
+    ASSERT_EQ(Answer(query->Fetch(rows, 9, more)), 0);
+    ASSERT_EQ(rows.lobs.size(), 2u);
+    EXPECT_EQ(Read(*rows.lobs[0]) + Read(*rows.lobs[1]), "oneThree");
+    ASSERT_EQ(Run(*other, "select lo_unlink(c) from o where k = 3"), 0);
+    std::uint64_t length = 0;
+    EXPECT_EQ(Read(*lists[0]), "error 22922");
+    EXPECT_EQ(Answer(lists[0]->Length(length)), 22922);
+    EXPECT_FALSE(connection_->InTransaction());
+    connection_.reset();
+    EXPECT_EQ(Read(*lists[0]), "error 22275");
+}
+
+// Values that are bound become new objects, in each form of array; so does empty_blob().
+TEST_P(ServerObjects, AreMadeOfBytes) {
+    const std::string text(300'000, 'x');
+    Rows rows;
+    rows.rows.clear();
+    for (int row = 0; row < 20; ++row) rows.rows.push_back({Integer(row + 10), View(Kind::bytes, std::string_view(text).substr(row))});
+    const auto insert = Prepared("insert into o values(%1, %2, null)", rows.rows[0]);
+    EXPECT_EQ(Execute(*insert, rows, {0, 20, true}), 0);
+    EXPECT_EQ(Query("select count(*), count(distinct c), sum(length(lo_get(c))) from o where k > 9"), "20,20,5999810;");
+    const auto plain = Prepared("insert into o values(%1, %2)", rows.rows[0]);
+    EXPECT_EQ(Execute(*plain, rows, {0, 20, true}), 0);        // as one statement
+    EXPECT_EQ(Query("select count(*), count(distinct c), sum(length(lo_get(c))) from o where k > 9"), "40,40,11999620;");
+    const Kept lob = Locked("select c from o where k = 29");
+    std::string read(text.size(), '#');
+    std::size_t count = 0;
+    ASSERT_EQ(Answer(lob->Read(0, std::as_writable_bytes(std::span(read)), count)), 0);
+    EXPECT_EQ(read.substr(0, count), text.substr(19));
+    MustRun("delete from o where k > 9");
+    const struct { const char* sql; std::vector<Datum> values; const char* stored; } cases[] = {
+        {"insert into o values(5, %1, %2)", {View(Kind::bytes, "raw"), View(Kind::bytes, "b")}, "5,raw,b;"},
+        {"insert into o values(5, %1, %2)", {Text("6869"), Text("6A")}, "5,hi,j;"},    // digits
+        {"insert into o values(5, %1, empty_blob())", {Null()}, "5,null,null;"},
+        {"insert into o(b, k, c) values(empty_blob(), 5, EMPTY_BLOB ( ))", {}, "5,null,null;"},
+        {"insert into o(k, c) select k + 2, c from o where k = 3", {}, "5,three,null;"}};
+    for (const auto& c : cases) {
+        ASSERT_EQ(Run(c.sql, c.values), 0) << c.sql;
+        EXPECT_EQ(Query("select k, convert_from(lo_get(c), 'UTF8'), convert_from(b, 'UTF8') from o where k = 5"), c.stored) << c.sql;
+        MustRun("delete from o where k = 5");
+    }
+    EXPECT_EQ(Run("update o set c = %1 where k = %2", {View(Kind::bytes, "up"), Integer(2)}), 0);
+    EXPECT_EQ(Bytes(), "1,one;2,up;3,three;");
+    EXPECT_EQ(Run("insert into o(c) values(hextoraw('0A'))"), 932);
+    EXPECT_EQ(Run("insert into o(c) values(%1)", {Text("no digits")}), 1465);
+    EXPECT_EQ(Run("delete from o where c = %1", {View(Kind::bytes, "one")}), 932);
+    EXPECT_EQ(Bytes(), "1,one;2,up;3,three;") << "and the transaction goes on";
+}
+
 std::string FreshFile(const std::string& folder) { return folder + "/test.db"; }
 std::string InMemory(const std::string&) { return ":memory:"; }
 
@@ -1065,6 +1168,7 @@ std::string NameOf(const testing::TestParamInfo<Engine>& info) { return info.par
 
 INSTANTIATE_TEST_SUITE_P(Engines, Contract, testing::Values(kSqliteFile, kSqliteMemory, kPostgres), NameOf);
 INSTANTIATE_TEST_SUITE_P(Engines, LobContract, testing::Values(kSqliteFile, kSqliteMemory, kPostgres), NameOf);
+INSTANTIATE_TEST_SUITE_P(Engines, ServerObjects, testing::Values(kPostgres), NameOf);
 INSTANTIATE_TEST_SUITE_P(Engines, SharedContract, testing::Values(kSqliteFile, kPostgres), NameOf);
 
 }  // namespace

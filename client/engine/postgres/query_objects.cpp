@@ -1,0 +1,110 @@
+// Values for columns of large objects that the server keeps for themselves: bytes that are bound for one, and empty_blob(),
+// become a new object. Which those are is asked of the server: it tells the types of placeholders in their places.
+#include "engine/postgres/query_objects.h"
+
+#include <algorithm>
+#include <cstdlib>
+
+#include "engine/pieces.h"
+#include "engine/postgres/query.h"
+#include "handles/errors.h"
+
+namespace engine::postgres {
+namespace {
+
+constexpr std::size_t kNotBound = static_cast<std::size_t>(-1);
+
+// Bytes that a statement gives, and where they stand in its text.
+struct Given {
+    std::string_view text;
+    std::size_t parameter;    // from 0; kNotBound: it is empty_blob()
+};
+
+// Placeholders of texts and bytes, and empty_blob(). `placeholders` counts all, as far as they are numbered.
+std::vector<Given> BytesGiven(std::string_view sql, const std::vector<Kind>& kinds, std::size_t& placeholders) {
+    std::vector<Given> given;
+    const PieceList pieces = Split(sql);
+    placeholders = kinds.size();
+    for (std::size_t at = 0; at < pieces.size(); ++at) {
+        const std::string_view piece = pieces[at];
+        if (piece.starts_with('$')) {
+            const auto number = static_cast<std::size_t>(std::strtoul(std::string(piece.substr(1)).c_str(), nullptr, 10));
+            placeholders = std::max(placeholders, number);
+            const Kind kind = number > 0 && number <= kinds.size() ? kinds[number - 1] : Kind::null;
+            if (kind == Kind::text || kind == Kind::bytes) given.push_back({piece, number - 1});
+        } else if (IsWord(piece, "empty_blob") && at + 2 < pieces.size() && pieces[at + 1] == "(" && pieces[at + 2] == ")" &&
+                   (at == 0 || pieces[at - 1] != ".")) {
+            const std::string_view end = pieces[at + 2];
+            given.push_back({{piece.data(), static_cast<std::size_t>(end.data() + 1 - piece.data())}, kNotBound});
+        }
+    }
+    return given;
+}
+
+// The statement with others for what it gives.
+std::string WithOthers(std::string_view sql, const std::vector<Given>& given, const std::vector<std::string>& others) {
+    std::string text;
+    const char* from = sql.data();
+    for (std::size_t index = 0; index < given.size(); ++index) {
+        text.append(from, given[index].text.data()).append(others[index]);
+        from = given[index].text.data() + given[index].text.size();
+    }
+    return text.append(from, sql.data() + sql.size());
+}
+
+}  // namespace
+
+// The server reads a text for such a column as the number of an object.
+bool PgQuery::GivesTextsToObjects() const {
+    const std::vector<Oid>& types = bound_.Types();
+    for (std::size_t index = 0; index < std::min(types.size(), kinds_.size()); ++index) {
+        if (kinds_[index] == Kind::text && connection_.IsObjectType(types[index])) return true;
+    }
+    return false;
+}
+
+Status PgQuery::PrepareForObjects(Status status, std::uint32_t& error_offset) {
+    const bool misfits = status.Ok() ? GivesTextsToObjects() : status.Number() == errors::kInconsistentTypes;
+    if (effect_ != Effect::changes || !misfits || QuotesOtherwise(sql_)) return status;
+    bool found = false;
+    if (Status asked = FindObjects(found); connection_.Broken()) return asked;
+    return found ? PrepareAs(DeclaredTypes(), error_offset) : status;
+}
+
+Status PgQuery::FindObjects(bool& found) {
+    std::size_t placeholders = 0;
+    const std::vector<Given> given = BytesGiven(sql_, kinds_, placeholders);
+    if (given.empty()) return {};
+    std::vector<Oid> types = DeclaredTypes();
+    std::vector<std::string> others;
+    std::vector<std::size_t> asked;    // the number of each's placeholder, from 0
+    for (const Given& bytes : given) {
+        const bool is_bound = bytes.parameter != kNotBound;
+        if (is_bound) types[bytes.parameter] = 0;
+        asked.push_back(is_bound ? bytes.parameter : placeholders++);
+        others.push_back('$' + std::to_string(asked.back() + 1));
+    }
+    const std::string name = connection_.NewName();
+    Result description;
+    std::uint32_t offset = 0;
+    Status status = SendPrepared(name, WithOthers(sql_, given, others), types, description, offset);
+    if (!status.Ok()) return status;
+    connection_.Forget(name);
+    for (std::size_t index = 0; index < given.size(); ++index) {
+        const Oid type = PQparamtype(description.get(), static_cast<int>(asked[index]));
+        Oid base = type;
+        if (status = connection_.BaseType(base); !status.Ok()) return status;
+        const bool is_bound = given[index].parameter != kNotBound;
+        others[index] = std::string(given[index].text);
+        if (!connection_.IsObjectType(type)) continue;
+        found = true;
+        others[index] = NewObject(is_bound ? others[index] : "''::bytea");
+        if (!is_bound) continue;
+        makes_object_.resize(placeholders);
+        makes_object_[given[index].parameter] = true;
+    }
+    text_ = WithOthers(sql_, given, others);
+    return status;
+}
+
+}  // namespace engine::postgres
