@@ -142,18 +142,26 @@ void Wire::SendQuery(const char* sql, const std::vector<const char*>& texts) noe
 }
 
 void Wire::SendQuery(const char* sql, const Values& values, bool binary_results) noexcept {
+    const AtOnce whole(*this, values);
     if (broken_ || short_of_memory_) return;
     Sent(PQsendQueryParams(connection_, sql, static_cast<int>(values.data.size()), nullptr, values.data.data(),
                            values.lengths.data(), values.formats.data(), binary_results));
-    SendLong(values);
 }
 
-// What libpq cannot send at once it moves to the front of its buffer, each time: of long values it sends all at once.
-void Wire::SendLong(const Values& values) noexcept {
+// What libpq cannot send at once it moves to the front of its buffer, each time, unless it may wait. Long values it waits
+// for, and takes what the server says meanwhile; it does so from an empty buffer on.
+Wire::AtOnce::AtOnce(Wire& wire, const Values& values) noexcept : wire_(wire) {
     std::int64_t bytes = 0;
     for (std::size_t index = 0; index < values.data.size(); ++index) bytes += values.data[index] ? values.lengths[index] : 0;
-    if (bytes <= kLong || broken_ || short_of_memory_) return;
-    broken_ = PQsetnonblocking(connection_, 0) != 0 || PQsetnonblocking(connection_, 1) != 0;
+    if (bytes <= kLong || wire.broken_ || wire.short_of_memory_) return;
+    int left = 1;
+    while ((left = PQflush(wire.connection_)) == 1 && wire.Wait()) continue;
+    waits_ = left == 0 && PQsetnonblocking(wire.connection_, 0) == 0;
+    wire.broken_ = !waits_;
+}
+
+Wire::AtOnce::~AtOnce() {
+    if (waits_ && PQsetnonblocking(wire_.connection_, 1) != 0) wire_.broken_ = true;
 }
 
 void Wire::SendPrepare(const char* name, const char* sql, std::span<const Oid> types) noexcept {
@@ -167,10 +175,10 @@ void Wire::SendDescribe(const char* name) noexcept {
 }
 
 void Wire::SendExecute(const char* name, const Values& values, bool binary_results) noexcept {
+    const AtOnce whole(*this, values);
     if (broken_ || short_of_memory_) return;
     Sent(PQsendQueryPrepared(connection_, name, static_cast<int>(values.data.size()), values.data.data(),
                              values.lengths.data(), values.formats.data(), binary_results));
-    SendLong(values);
 }
 
 // Without its end a batch cannot be read: the connection is of no use then.

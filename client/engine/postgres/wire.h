@@ -117,7 +117,18 @@ private:
     Status Settle() noexcept;
     bool Wait() noexcept;
     void Sent(int answer) noexcept;
-    void SendLong(const Values& values) noexcept;
+    // While one lives, libpq sends what it is given before it goes on, if those are long values.
+    class AtOnce {
+    public:
+        AtOnce(Wire& wire, const Values& values) noexcept;
+        ~AtOnce();
+        AtOnce(const AtOnce&) = delete;
+        AtOnce& operator=(const AtOnce&) = delete;
+
+    private:
+        Wire& wire_;
+        bool waits_ = false;
+    };
     static void OnNotice(void* self, const PGresult* result) noexcept;
 
     PGconn* connection_ = nullptr;

@@ -1152,6 +1152,10 @@ TEST_P(ServerObjects, AreMadeOfBytes) {
     }
     EXPECT_EQ(Run("update o set c = %1 where k = %2", {View(Kind::bytes, "up"), Integer(2)}), 0);
     EXPECT_EQ(Bytes(), "1,one;2,up;3,three;");
+    const std::string longest(40'000'000, 'x');                // more than is sent in passing
+    EXPECT_EQ(Run("insert into o values(5, %1, %2)", {View(Kind::bytes, longest), View(Kind::bytes, longest)}), 0);
+    EXPECT_EQ(Query("select length(lo_get(c)), length(b) from o where k = 5"), "40000000,40000000;");
+    MustRun("delete from o where k = 5");
     EXPECT_EQ(Run("insert into o(c) values(hextoraw('0A'))"), 932);
     EXPECT_EQ(Run("insert into o(c) values(%1)", {Text("no digits")}), 1465);
     EXPECT_EQ(Run("delete from o where c = %1", {View(Kind::bytes, "one")}), 932);
