@@ -376,18 +376,20 @@ Status PgConnection::DropMark() {
 
 namespace {
 
-// The next word of a text, as the server reads it; a quoted one with its quotes.
+// The next word of a text, as the server reads it: what stands in quotes is another name only where it has other letters.
 std::string TakeWord(std::string_view& text) {
-    while (!text.empty() && (text.front() == ' ' || text.front() == '\t' || text.front() == '\n')) text.remove_prefix(1);
+    const auto is_blank = [](char c) { return c == ' ' || c == '\t' || c == '\n'; };
+    while (!text.empty() && is_blank(text.front())) text.remove_prefix(1);
     std::string word;
     const bool quoted = text.starts_with('"');
-    while (!text.empty()) {
+    for (text.remove_prefix(quoted); !text.empty(); text.remove_prefix(1)) {
         const char c = text.front();
-        const bool ends = quoted ? c == '"' && word.size() > 0 : c == ' ' || c == '\t' || c == '\n' || c == ';';
-        if (ends && !quoted) break;
+        if (quoted && c == '"') {
+            text.remove_prefix(1);
+            if (!text.starts_with('"')) break;
+        }
+        if (!quoted && (is_blank(c) || c == ';')) break;
         word += !quoted && c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-        text.remove_prefix(1);
-        if (ends) break;
     }
     return word;
 }

@@ -127,7 +127,8 @@ constexpr StateRow kStates[] = {
 int NumberOf(std::string_view state, std::string_view message, Verb verb) {
     if (state == "23502" && verb == Verb::update) return errors::kNullUpdated;
     const bool stores = verb == Verb::insert || verb == Verb::update;
-    if (state == "22003" && stores) return errors::kAbovePrecision;
+    const bool is_real = message.ends_with("type real") || message.ends_with("type double precision");
+    if (state == "22003" && stores && !is_real) return errors::kAbovePrecision;
     for (const StateRow& row : kStates) {
         if (state.starts_with(row.state) && message.find(row.contains) != std::string_view::npos) return row.number;
     }

@@ -50,7 +50,7 @@ TEST_F(Blocks, GoBackToSavepoints) {
          "insert into t values(3); insert into t values(3); end;", 1, "1,2", 1086, "1,2"},
         {"begin savepoint b; insert into t values(3); savepoint c; rollback to b; rollback to a; "
          "insert into t values(5); insert into t values(5); end;", 1, "1", 1086, "1"},
-        {"begin insert into t values(9); savepoint \"a\"; rollback to A; insert into t values(1); end;", 1, "1,2", 1086,
+        {"begin insert into t values(9); savepoint \"A\"; rollback to a; insert into t values(1); end;", 1, "1,2", 1086,
          "1,2"},
         {"begin insert into t values(9); savepoint b; insert into t values(10); end;", 0, "1,2,9,10", 0, "1,2,9"},
         {"begin insert into t values(9); rollback to b; end;", 1086, "1,2", 1086, "1,2"},

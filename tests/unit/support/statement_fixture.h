@@ -200,7 +200,12 @@ constexpr const char* kEmbeddedFunctions =
     "create function hex(bytea) returns text language sql immutable as $$ select upper(encode($1, 'hex')) $$;"
     "create function hex(text) returns text language sql immutable as $$ select hex(convert_to($1, 'UTF8')) $$;"
     "create function zeroblob(int) returns bytea language sql immutable as $$ select decode(repeat('00', $1), 'hex') $$;"
-    "create function printf(text, int, text) returns text language sql immutable as $$ select repeat($3, $2) $$";
+    "create function printf(text, int, text) returns text language sql immutable as $$ select repeat($3, $2) $$;"
+    "create function quote(text) returns text language sql immutable as $$ select quote_nullable($1) $$;"
+    "create function quote(timestamp) returns text language sql stable as $$ select quote_nullable($1::text) $$;"
+    "do $$ declare t text; begin foreach t in array array['bigint', 'numeric', 'float8', 'tid', 'refcursor'] loop"
+    " execute format('create function quote(%s) returns text language sql immutable as ''select $1::text''', t); end loop; end $$;"
+    "create function quote(bytea) returns text language sql immutable as $$ select 'X' || quote_literal(hex($1)) $$";
 
 class StatementTest : public testing::Test, protected StatementCalls {
 protected:
