@@ -115,28 +115,31 @@ Status PgConnection::Recover(std::vector<Xid>& prepared) {
     return status;
 }
 
-// Names are the cluster's, not the database's. The function behind the view joins nothing to them.
+// Names are the cluster's, not the database's. The function behind the view joins nothing to them; it is asked by a statement
+// that the server keeps, once more where the application has dropped all of those.
 Status PgConnection::KeepsPrepared(const Xid& xid, bool& kept) {
     kept = false;
     if (!home_->TwoPhase()) return {};
-    Result found;
-    const auto ask = [&] {    // there are no quotes in the name
-        return Ask(("execute " + branch_question_ + "('" + NameOf(xid) + "')").c_str(), {}, found);
-    };
-    if (!branch_question_.empty()) {
-        Status status = ask();
+    if (Status status = Enter(); !status.Ok()) return status;
+    const std::string name = NameOf(xid);
+    const Wire::Values values{{name.c_str()}, {0}, {0}};
+    for (;;) {
+        const bool is_new = branch_question_.empty();
+        if (is_new) {
+            branch_question_ = NewName();    // another each time: who knows whether the last one is there
+            wire_->SendPrepare(branch_question_.c_str(), "select 1 from pg_catalog.pg_prepared_xact() where gid = $1", {});
+        }
+        wire_->SendExecute(branch_question_.c_str(), values, false);
+        wire_->Sync();
+        Result found;
+        Status status = wire_->Drain(&found);
+        Note();
         kept = status.Ok() && PQntuples(found.get()) > 0;
-        if (status.Ok() || Broken()) return status;
-        branch_question_.clear();    // the application may have dropped all statements
+        if (status.Ok()) return status;
+        branch_question_.clear();
+        if (in_transaction_) return Lose(status);
+        if (is_new || Broken()) return status;
     }
-    const std::string name = NewName();    // another each time: who knows whether the last one is there
-    const std::string prepare = "prepare " + name + "(text) as select 1 from pg_catalog.pg_prepared_xact() where gid = $1";
-    Status status = Ask(prepare.c_str(), {}, found);
-    if (!status.Ok()) return status;
-    branch_question_ = name;
-    status = ask();
-    kept = status.Ok() && PQntuples(found.get()) > 0;
-    return status;
 }
 
 }  // namespace engine::postgres

@@ -204,10 +204,9 @@ bool Wire::Wait() noexcept {
     const bool more = PQflush(connection_) == 1;
     const bool stopping = heeds_ && Asked();
     if (stopping && Clock::now() - cancelled_ > kBetweenCancels) Cancel();
-    pollfd places[] = {{PQsocket(connection_), static_cast<short>(more ? POLLIN | POLLOUT : POLLIN), 0},
-                       {wake_, static_cast<short>(heeds_ ? POLLIN : 0), 0}};
+    pollfd places[] = {{PQsocket(connection_), static_cast<short>(more ? POLLIN | POLLOUT : POLLIN), 0}, {wake_, POLLIN, 0}};
     const auto end = stopping ? Clock::now() + kBetweenCancels : kForever;
-    if (poll(places, 2, Milliseconds(end)) < 0) return errno == EINTR;
+    if (poll(places, heeds_ ? 2 : 1, Milliseconds(end)) < 0) return errno == EINTR;
     if (places[1].revents & POLLIN) {
         std::uint64_t count = 0;
         if (read(wake_, &count, sizeof count) < 0) count = 0;    // somebody else's wake was as good

@@ -399,6 +399,12 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
         EXPECT_FALSE(read_only);
         EXPECT_FALSE(connection_->InTransaction());
         EXPECT_EQ(All(), commits ? "" : "1;");
+        bool kept[] = {false, false, true};
+        EXPECT_EQ(Answer(other->KeepsPrepared(xid, kept[0])), 0);
+        ASSERT_EQ(Run(*other, "deallocate all"), 0);           // the engine's own statements, too
+        EXPECT_EQ(Answer(other->KeepsPrepared(xid, kept[1])), 0);
+        EXPECT_EQ(Answer(other->KeepsPrepared({.format = 1}, kept[2])), 0);
+        EXPECT_TRUE(kept[0] && kept[1] && !kept[2]);
         prepared.clear();
         ASSERT_EQ(Answer(other->Recover(prepared)), 0);
         EXPECT_EQ(prepared, std::vector{xid});
