@@ -31,7 +31,7 @@ public:
 
     void Clear() noexcept {
         const int state = state_.load(std::memory_order_relaxed);
-        if (state == kListed) Empty();
+        if (state == kListed) [[unlikely]] Empty();
         else if (state != kNone) state_.store(kNone, std::memory_order_relaxed);
     }
     // Nothing for a status without a number. Without memory a further record is lost.

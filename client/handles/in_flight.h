@@ -88,7 +88,7 @@ extern const bool system_barrier;
 
 // The thread's own side of the barrier.
 inline void Fence() noexcept {
-    if (system_barrier) std::atomic_signal_fence(std::memory_order_seq_cst);
+    if (system_barrier) [[likely]] std::atomic_signal_fence(std::memory_order_seq_cst);
     else std::atomic_thread_fence(std::memory_order_seq_cst);
 }
 
@@ -134,7 +134,7 @@ class CallInFlight {
 public:
     CallInFlight() noexcept {
         using namespace in_flight;
-        if (own.depth != 0 || !own.slot) {
+        if (own.depth != 0 || !own.slot) [[unlikely]] {
             EnterSlowly();
             return;
         }
@@ -144,14 +144,14 @@ public:
     }
     ~CallInFlight() {
         using namespace in_flight;
-        if (own.depth != 1 || !own.slot) {
+        if (own.depth != 1 || !own.slot) [[unlikely]] {
             LeaveSlowly();
             return;
         }
         own.depth = 0;
         own.slot->entered.store(kOutside, std::memory_order_release);
         Fence();
-        if (own.slot->keeps.load(std::memory_order_relaxed) || own.gave_up_lock) HandBack(*own.slot);
+        if (own.slot->keeps.load(std::memory_order_relaxed) || own.gave_up_lock) [[unlikely]] HandBack(*own.slot);
     }
     CallInFlight(const CallInFlight&) = delete;
     CallInFlight& operator=(const CallInFlight&) = delete;

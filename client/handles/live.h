@@ -92,10 +92,11 @@ template <Kind kind>
     if constexpr (constexpr int at = RememberedAt(kind); at < 0) {
         return KindOf(pointer) == kind;
     } else {
-        if (in_flight::Closed()) return KindOf(pointer) == kind;
+        if (in_flight::Closed()) [[unlikely]] return KindOf(pointer) == kind;
         const Found& last = last_found[at];
         const bool stands = last.pointer == pointer && last.erased == erased_objects.load(std::memory_order_acquire);
-        return stands || FindAndRemember(pointer, kind);
+        if (stands) [[likely]] return true;
+        return FindAndRemember(pointer, kind);
     }
 }
 

@@ -41,7 +41,7 @@ Status Defines::Activate(const std::vector<engine::Column>& columns, const std::
     }
     changed_ = true;
     active_.clear();
-    in_pieces_ = false;
+    in_pieces_ = at_once_ = false;
     for (std::uint32_t index = 0; index < made_.size(); ++index) {
         const std::shared_ptr<DataArea>& area = made_[index];
         if (!area || !area->HasHandle()) continue;
@@ -51,7 +51,7 @@ Status Defines::Activate(const std::vector<engine::Column>& columns, const std::
         Active& active = active_.emplace_back(Active{area, index, {}, {}});
         active.converters = values::ForColumn(*area->Type()->out, area->workspace.column);
         if (area->InPieces()) active.renderers = values::ForColumn(*area->Type()->pieces, area->workspace.column);
-        in_pieces_ |= area->InPieces();
+        (area->InPieces() ? in_pieces_ : at_once_) = true;
     }
     if (active_.empty()) return Error(errors::kNoDefines);
     changed_ = false;
@@ -61,6 +61,7 @@ Status Defines::Activate(const std::vector<engine::Column>& columns, const std::
 
 int Defines::StoreRow(std::size_t index, std::span<const engine::Datum> row) const {
     int worst = 0;
+    if (!at_once_) return worst;
     for (const Active& active : active_) {
         DataArea& area = *active.area;
         if (area.InPieces()) continue;

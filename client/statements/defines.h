@@ -55,5 +55,6 @@ private:
     std::vector<Active> active_;
     bool changed_ = true;    // since active_ was made
     std::uint64_t seen_ = 0;
-    bool in_pieces_ = false;
+    bool in_pieces_ = false;    // some of active_ are
+    bool at_once_ = false;      // some are not
 };

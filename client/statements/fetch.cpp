@@ -87,7 +87,8 @@ Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> v
             std::any_of(values.begin(), values.end(), [](const auto& value) { return value.kind == engine::Kind::lob; });
         if (has_lobs)
             if (Status status = ReadLobs(values); !status.Ok()) return status;
-        statement_.pieces_.Begin(index_, has_lobs ? std::span<const engine::Datum>(row_) : values, has_lobs ? &objects_ : nullptr);
+        if (has_lobs) statement_.pieces_.Begin(index_, row_->values, &row_->objects);
+        else statement_.pieces_.Begin(index_, values, nullptr);
     } else {
         ++statement_.run_.rows_fetched;
     }
@@ -97,19 +98,20 @@ Status Statement::FetchSink::Row(std::uint32_t, std::span<const engine::Datum> v
 
 // A row that waits outlasts the views of its large objects: those that go in pieces are read, or taken as they are.
 Status Statement::FetchSink::ReadLobs(std::span<const engine::Datum> values) {
-    row_.assign(values.begin(), values.end());
-    contents_.resize(values.size());
-    objects_.assign(values.size(), nullptr);
+    RowOfLobs& row = row_.emplace();
+    row.values.assign(values.begin(), values.end());
+    row.contents.resize(values.size());
+    row.objects.assign(values.size(), nullptr);
     for (const Defines::Active& active : statement_.defines_.All()) {
-        engine::Datum& value = row_[active.column];
+        engine::Datum& value = row.values[active.column];
         if (!active.area->InPieces() || value.kind != engine::Kind::lob) continue;
         values::LobSession* const session = statement_.UsedLink()->lobs.get();
-        std::shared_ptr<engine::Lob>& object = objects_[active.column];
+        std::shared_ptr<engine::Lob>& object = row.objects[active.column];
         std::uint64_t length = 0;
         int error = values::TakeLong(value, session, object);
         if (object && !OutgoingValue::Streams(*active.area, object->Kind())) object = nullptr;
         if (error == 0 && !object)
-            error = values::ReadLob(values[active.column], session, values::kWholeLob, contents_[active.column], value, length);
+            error = values::ReadLob(values[active.column], session, values::kWholeLob, row.contents[active.column], value, length);
         if (error != 0) return Error(error);
     }
     return {};

@@ -1,6 +1,8 @@
 // Where fetched rows go: into the defines, and what is taken in pieces to the piece stream.
 #pragma once
 
+#include <optional>
+
 #include "statements/cursor.h"
 #include "statements/statement.h"
 
@@ -19,7 +21,11 @@ private:
     ub4 index_;
     const bool in_pieces_;
     Status warning_;
-    std::vector<engine::Datum> row_;        // one that goes in pieces: with its large objects read
-    std::vector<std::string> contents_;     // of those, by column
-    PieceStream::Objects objects_;          // the long ones
+    // A row that goes in pieces, with its large objects.
+    struct RowOfLobs {
+        std::vector<engine::Datum> values;
+        std::vector<std::string> contents;    // of those that are read, by column
+        PieceStream::Objects objects;         // the long ones
+    };
+    std::optional<RowOfLobs> row_;
 };

@@ -74,19 +74,22 @@ Status PieceStream::Fail(int error) noexcept {
 Status PieceStream::SetPlace(DataArea& area, const PieceBuffer& place) {
     const bool waits = Wants() != Use::none && !asks_ && wanted_.area == &area && !wanted_.ByCallback();
     if (!waits || place.piece > OCI_LAST_PIECE) return Error(errors::kIllegalOperation);
-    const bool goes_on = place.piece == OCI_NEXT_PIECE || place.piece == OCI_LAST_PIECE;
-    if (!wanted_.out && goes_on != wanted_.continued) return Error(errors::kIllegalOperation);
-    const bool null_in = !wanted_.out && SaysNull(place);
-    if (!null_in && !place.length) return Error(errors::kBadLength);
-    if (!null_in && !place.buffer) return Error(errors::kBadBuffer);
+    if (!wanted_.out) {
+        const bool goes_on = place.piece == OCI_NEXT_PIECE || place.piece == OCI_LAST_PIECE;
+        if (goes_on != wanted_.continued) return Error(errors::kIllegalOperation);
+    }
+    if (wanted_.out || !SaysNull(place)) {
+        if (!place.length) return Error(errors::kBadLength);
+        if (!place.buffer) return Error(errors::kBadBuffer);
+    }
     area.piece = place;
     area.piece.is_set = true;
     return {};
 }
 
 // Ok when the place of the piece is in its area. A polled piece stays wanted whatever is answered.
-inline Status PieceStream::Place(CallbackDriver& driver) {
-    if (wanted_.ByCallback()) return Ask(driver);
+inline Status PieceStream::Place(CallbackDriver& driver, bool by_callback) {
+    if (by_callback) return Ask(driver);
     return wanted_.TakePlace() ? Status() : Poll(wanted_);
 }
 
@@ -195,7 +198,7 @@ Status PieceStream::Collect(CallbackDriver& driver) {
 Status PieceStream::CollectPiece(BindArea& bind, CallbackDriver& driver) {
     wanted_.area = &bind;
     const bool by_callback = wanted_.ByCallback();
-    if (Status status = Place(driver); !status.Ok()) return status;
+    if (Status status = Place(driver, by_callback); !status.Ok()) return status;
     if (const int error = AppendPiece(bind, bind.piece, by_callback)) return Fail(error);
     wanted_.asked = false;
     if (!wanted_.continued) ++wanted_.index;
@@ -327,16 +330,9 @@ int PieceStream::NextValue(const Defines& defines) {
     return 0;
 }
 
-// Fills the buffer from what is left of the value; terminated types get a zero that is not counted.
-int PieceStream::Move(const PieceBuffer& piece) {
+// Fills the buffer from what is left of the value, as it is read.
+int PieceStream::MoveParts(char* buffer, std::size_t room, std::size_t& moved) {
     DataArea& area = *wanted_.area;
-    const std::size_t zero = area.Type()->code != SQLT_STR ? 0 : area.workspace.utf16 ? 2 : 1;
-    if (!piece.length) return errors::kBadLength;
-    if (!piece.buffer) return errors::kBadBuffer;
-    if (*piece.length < zero) return errors::kBadLength;
-    const std::size_t room = *piece.length - zero;
-    auto* const buffer = static_cast<char*>(piece.buffer);
-    std::size_t moved = 0;
     for (;;) {
         if (const int error = value_.Refill(area)) return error;
         const std::size_t part = PieceLength(area, value_.rest, room - moved);
@@ -345,8 +341,27 @@ int PieceStream::Move(const PieceBuffer& piece) {
         moved += part;
         if (part == 0 || moved == room || value_.Ends()) break;
     }
-    if (moved == 0 && !value_.Ends()) return errors::kBadLength;
-    std::memset(buffer + moved, 0, zero);
+    return moved == 0 && !value_.Ends() ? errors::kBadLength : 0;
+}
+
+// Mostly the buffer takes all that is left. Terminated types get a zero that is not counted.
+int PieceStream::Move(const PieceBuffer& piece) {
+    const DataArea& area = *wanted_.area;
+    const std::size_t zero = area.Type()->code != SQLT_STR ? 0 : area.workspace.utf16 ? 2 : 1;
+    if (!piece.length) return errors::kBadLength;
+    if (!piece.buffer) return errors::kBadBuffer;
+    if (*piece.length < zero) return errors::kBadLength;
+    const std::size_t room = *piece.length - zero;
+    auto* const buffer = static_cast<char*>(piece.buffer);
+    std::size_t moved = 0;
+    if (value_.IsAtHand() && value_.rest.size() <= room) [[likely]] {
+        moved = value_.rest.copy(buffer, room);
+        value_.rest = {};
+    } else if (const int error = MoveParts(buffer, room, moved)) {
+        return error;
+    }
+    if (zero > 0) buffer[moved] = 0;
+    if (zero > 1) buffer[moved + 1] = 0;
     *piece.length = static_cast<ub4>(moved);
     return 0;
 }
@@ -366,10 +381,11 @@ int PieceStream::TakePiece(bool& value_ends) {
         value_ends = error != errors::kBadLength && error != errors::kBadBuffer;    // else another buffer may do
         return error;
     }
-    const bool cut = !value_.Ends() && place.piece == OCI_LAST_PIECE;
+    const bool goes_on = !value_.Ends();
+    const bool cut = goes_on && place.piece == OCI_LAST_PIECE;
     TellCode(area, row, place, cut ? errors::kTruncated : 0);
     TellIndicator(area, row, place, cut ? value_.CutIndicator() : 0);
-    value_ends = value_.Ends() || cut;
+    value_ends = !goes_on || cut;
     return 0;
 }
 
@@ -387,7 +403,7 @@ int PieceStream::EndCut(const PieceBuffer& place) {
 Status PieceStream::HandPieces(CallbackDriver& driver) {
     while (wanted_.area) {
         const bool by_callback = wanted_.ByCallback();
-        if (Status status = Place(driver); !status.Ok()) return status;
+        if (Status status = Place(driver, by_callback); !status.Ok()) return status;
         if (!wanted_.area) break;
         bool value_ends = false;
         if (const int error = TakePiece(value_ends)) {

@@ -90,7 +90,7 @@ private:
     void EndUnlessLiving() noexcept;
     [[nodiscard]] bool AllLiving() const noexcept;
     Status Fail(int error) noexcept;
-    Status Place(CallbackDriver& driver);
+    Status Place(CallbackDriver& driver, bool by_callback);
     Status Ask(CallbackDriver& driver);
     void ForgetValues() noexcept;
     Status CollectPiece(BindArea& bind, CallbackDriver& driver);
@@ -101,6 +101,7 @@ private:
     int NextValue(const Defines& defines);
     int TakePiece(bool& value_ends);
     int Move(const PieceBuffer& place);
+    int MoveParts(char* buffer, std::size_t room, std::size_t& moved);
     int EndCut(const PieceBuffer& place);
 
     const void* const statement_;

@@ -55,6 +55,7 @@ public:
     int Refill(DataArea& area) { return rest.empty() && object_ ? ReadMore(area) : 0; }
 
     [[nodiscard]] bool Ends() const { return rest.empty() && !object_; }
+    [[nodiscard]] bool IsAtHand() const { return !object_; }    // all that is left of it
     [[nodiscard]] std::int16_t CutIndicator() const;    // for one of which not all is taken
     std::string_view rest;    // in the application's form, at hand: views what was given, or the area's workspace
 
