@@ -32,7 +32,7 @@ std::string Parse(std::string_view text, std::string_view model, const char* lan
 TEST(DateToText, EachElement) {
     const struct { const char* value; const char* model; const char* text; } cases[] = {
         {"2024-02-09", "YYYY YYY YY Y RRRR RR", "2024 024 24 4 2024 24"}, {"2024-02-09", "SYYYY Y,YYY", " 2024 2,024"},
-        {"-0044-03-15", "SYYYY YYYY BC B.C. ad A.d.", "-0044 0044 BC B.C. bc B.c."},
+        {"-0044-03-15", "SYYYY YYYY BC B.C. ad A.d. IYYY", "-0044 0044 BC B.C. bc B.c. 0044"},
         {"0987-01-01", "Y,YYY FMY,YYY YYYY", "0,987 0,987 987"},
         {"2024-02-09", "YEAR Year year", "TWENTY TWENTY-FOUR Twenty Twenty-Four twenty twenty-four"},
         {"1900-02-09", "YEAR", "NINETEEN HUNDRED"}, {"2005-02-09", "Year", "Two Thousand Five"},
@@ -43,7 +43,7 @@ TEST(DateToText, EachElement) {
         {"2024-09-04", "DAY Day day fmDay DY Dy dy D", "WEDNESDAY Wednesday wednesday Wednesday WED Wed wed 4"},
         {"2024-09-01", "DAY|D", "SUNDAY   |1"},
         {"2024-12-30", "DDD DD WW W IW IYYY IYY IY I", "365 30 53 5 01 2025 025 25 5"},
-        {"2021-01-03", "DDD WW W IW IYYY", "003 01 1 53 2020"}, {"1582-10-15", "DDD J", "278 2299161"}, {"2021-01-07", "WW", "01"},
+        {"2021-01-03", "DDD WW W IW IYYY", "003 01 1 53 2020"}, {"1582-10-15", "DDD J", "278 2299161"}, {"2021-01-07", "WW W", "01 1"},
         {"-4712-01-01", "J", "0000001"}, {"9999-12-31", "J", "5373484"},
         {"2024-02-09 00:05:09", "HH HH12 HH24 MI SS SSSSS AM", "12 12 00 05 09 00309 AM"},
         {"2024-02-09 12:05:09", "HH HH24 PM P.M. a.m. Am", "12 12 PM P.M. p.m. Pm"},
@@ -57,6 +57,7 @@ TEST(DateToText, EachElement) {
         {"2024-02-09 01:02:03.123456", "SSXFF FF1 FF3 FF6 FF9", "03.123456 1 123 123456 123456000"},
         {"2024-02-09 01:02:03.123456789", "FF FF2", "123456789 12"},
         {"2024-02-09 01:02:03 -03:30", "TZH:TZM TZR", "-03:30 -03:30"},
+        {"2024-02-09 01:02:03 -00:30", "TZH:TZM YYSP", "-00:30 TWENTY-FOUR"},
         {"2024-02-09", "\"Day\" DD \"of\" fmMonth, yyyy/mm-dd;.:", "Day 09 of February, 2024/2-9;.:"},
         {"2024-02-09", "DL|DS|TS", "Friday, February 9, 2024|2/9/2024|12:00:00 AM"},
         {"2024-02-09", "DS DD", "2/9/2024 09"}, {"2024-02-09", "", ""},
@@ -128,6 +129,18 @@ TEST(DateFromText, Reads) {
         {"1999-05-09  ", "FXYYYY-FXMM-DD", "1999-05-09 00:00:00"}, {"01-JAN-2031", "DD-MON-RR", "2031-01-01 00:00:00"},
         // Four digits for a short year: just four, and no number behind.
         {"1404-05", "YY-MM", "1404-05-01 00:00:00"}, {"MAY1404", "MONYY", "1404-05-01 00:00:00"},
+        {"1404-05", "YYY-MM", "1404-05-01 00:00:00"}, {"4-01-02", "YY-MM-DD", "2004-01-02 00:00:00"},
+        {"024-01-02", "RRRR-MM-DD", "0024-01-02 00:00:00"},
+        // What stands in the place of a mark: a sign of what follows, the mark itself, blanks.
+        {"15.03-44", "DD.MM.SYYYY", "-0044-03-15 00:00:00"}, {"15-03-44", "DD-MM-SYYYY", "0044-03-15 00:00:00"},
+        {"+44-03-15", "SYYYY-MM-DD", "0044-03-15 00:00:00"},
+        {"2024-01-01 10-05:30", "YYYY-MM-DD HH24 TZH:TZM", "2024-01-01 10:00:00 -05:30"},
+        {"2024-01-01 10-05:30", "YYYY-MM-DD HH24 TZR", "2024-01-01 10:00:00 -05:30"},
+        {"29 may 2024", "DD-MM-YYYY", "2024-05-29 00:00:00"}, {"May of 2024", "MONTH\" of \"YYYY", "2024-05-01 00:00:00"},
+        {"May 2024", "FXFMMonth YYYY", "2024-05-01 00:00:00"}, {"1-2-3,25", "YYYY-MM-DDXFF", "0001-02-03 00:00:00.25"},
+        {"2024-1-1 1.5", "FXFMYYYY-MM-DD SSXFF3", "2024-01-01 00:00:01.5"},
+        {"01-01-2024 10", "DD-MM-YYYY HH AM", "2024-01-01 10:00:00"},
+        {"2024-366", "YYYY-DDD", "2024-12-31 00:00:00"}, {"5373484", "J", "9999-12-31 00:00:00"},
     };
     for (const auto& c : cases) EXPECT_EQ(Parse(c.text, c.model), c.value) << c.text << ' ' << c.model;
     EXPECT_EQ(Parse("9. märz 2024", "DD. MONTH YYYY", "german"), "2024-03-09 00:00:00");
@@ -157,6 +170,11 @@ TEST(DateFromText, Refuses) {
         {"2024 BC", "SYYYY BC", 1819}, {"2460370 2023", "J YYYY", 1831}, {"2460370 1", "J MM", 1833},
         {"2460370 1", "J DD", 1834}, {"2024-02-29 MON", "YYYY-MM-DD DY", 1835}, {"3600 2", "SSSSS HH24", 1836},
         {"3600 1", "SSSSS MI", 1837}, {"3600 1", "SSSSS SS", 1838}, {"10 +15:00", "HH24 TZH:TZM", 1874},
+        {"2024-2-9", "FXFMYYYY-MM-FMDD", 1862}, {"2024- 02-09", "FXYYYY-MM-DD", 1858}, {"2024", "FXYYYYHH24", 1840},
+        {"2024 -02", "YYYY MM", 1858}, {"2024 of02", "FXYYYY\"of\"MM", 1861}, {"2024o", "YYYY\"of\"", 1840},
+        {"1404", "FXYY", 1830}, {"2024", "Y,YYY", 1861}, {"01,5", "FXSSXFF1", 1861}, {"1.2345", "SSXFF3", 1830},
+        {"01.5", "FXSSXFF3", 1862}, {"2024-000", "YYYY-DDD", 1848}, {"0000-001", "YYYY-DDD", 1841}, {"0", "D", 1846},
+        {"1721059", "J", 1864}, {"1721423", "J", 1864}, {"3600 1 PM", "SSSSS HH AM", 1836},
         {"10 +05:60", "HH24 TZH:TZM", 1875}, {"10 Atlantis", "HH24 TZR", 1882}, {"10 12", "HH24 TZD", 1857},
     };
     for (const auto& c : cases)

@@ -62,6 +62,9 @@ TEST(NumberToText, EveryElement) {
         {"-9.96E-100", "9.9EEEE", "-1.0E-99"}, {"1E-130", "99EEEE", " 1E-130"},
         // A negative value stays one when its digits become 0.
         {"-0.001", "9.99", " -.00"}, {"-0.001", "9.99S", " .00-"}, {"-0.001", "9.99PR", " <.00>"},
+        {"5", "FM999PR", "5"}, {"255", "xX", " ff"}, {"4", "FMrN", "iv"}, {"3999", "FMRN", "MMMCMXCIX"},
+        {"1.5", "FM9.90", "1.50"}, {"1.5", "FM9.99EEEE", "1.5E+00"}, {"1.5", "FM9.90EEEE", "1.50E+00"},
+        {"1E100", "9.9EEEE", " 1.0E+100"}, {"1E-100", "9.9EEEE", " 1.0E-100"}, {"0.6", "9", " 1"}, {"0.04", "FM9.9", "0."},
         {"-0.4", "99MI", " 0-"},     {"-0.001", "B9.99", "     "},
     };
     for (const auto& c : cases) EXPECT_EQ(Formatted(c.number, c.model), c.text) << c.number << " by " << c.model;
@@ -69,7 +72,7 @@ TEST(NumberToText, EveryElement) {
 
 TEST(NumberToText, WhatDoesNotFitTheModel) {
     const struct { const char* number; const char* model; const char* text; } cases[] = {
-        {"123", "99", "###"}, {"-123", "99.9", "#####"}, {"123", "FM99", "###"}, {"256", "XX", "###"},
+        {"123", "99", "###"}, {"-123", "99.9", "#####"}, {"123", "FM99", "###"}, {"256", "XX", "###"}, {"256", "FMXX", "##"},
         {"1.5", ".99", "####"}, {"4000", "RN", "###############"}, {"0", "RN", "###############"},
         {"99.96", "99.9", "22065"}, {"9.5", "9", "22065"}, {"9.96", "9V9", "22065"}, {"10", "9V9", "###"},
         {"9.95E125", "9.9EEEE", "22065"}, {"-9.999999999E125", "9EEEE", "22065"}, {"-1", "XX", "22060"}};
@@ -83,7 +86,8 @@ TEST(NumberToText, WhatDoesNotFitTheModel) {
 
 TEST(NumberToText, ModelsThatAreNone) {
     for (const char* model :
-         {"Q",    "9 9", "9.9.9", ",99", "9,G9", "9D9.9", ".9,9",   "99MI9",   "MI99", "99MIS", "S99S",
+         {"9LB9", "9L.9", "9EEEE.", "9EEEE,", "9EEEEEEEE", "9V9EEEE", ".9EEEE", "9G9.9", "9,9D9", "9.9,9", ".L9", "S99MI",
+          "Q",    "9 9", "9.9.9", ",99", "9,G9", "9D9.9", ".9,9",   "99MI9",   "MI99", "99MIS", "S99S",
           "9S9",  "S",   "$",     "$$9", "LC9",  "BB9",   "9EEEE9", "9,9EEEE", "EEEE", "9V9.9", "TM8",
           "TM99", "9TM", "XX9",   "X0",  "RNX",  "9FM",   "FM",     "FMFM9",   ".",    "G9",    "9LL9"})
         EXPECT_EQ(Formatted("1", model), "22061") << model;
@@ -91,6 +95,7 @@ TEST(NumberToText, ModelsThatAreNone) {
 
 TEST(NumberToText, SettingsOfTheNlsText) {
     EXPECT_EQ(Formatted("1234567.5", "9G999G999D99", kGerman), " 1.234.567,50");
+    EXPECT_EQ(Formatted("1234", "9,999", kGerman), " 1,234") << "as it is written";
     EXPECT_EQ(Formatted("12", "L999", kGerman), "  \xE2\x82\xAC" "12");
     EXPECT_EQ(Formatted("12.5", "99L99", kGerman), " 12\xE2\x82\xAC" "50");
     EXPECT_EQ(Formatted("12", "C99U", kGerman), "22061");
@@ -118,6 +123,7 @@ TEST(NumberFromText, EveryElement) {
     };
     for (const auto& c : cases) EXPECT_EQ(Parsed(c.text, c.model), c.number) << c.text << " by " << c.model;
     EXPECT_EQ(Parsed("1.234,5", "9G999D9", kGerman), "1234.5");
+    EXPECT_EQ(Parsed("1,234", "9,999", kGerman), "1234");
     EXPECT_EQ(Parsed("\xE2\x82\xAC" "12", "L99", kGerman), "12");
     EXPECT_EQ(Parsed(std::string(2000, '0') + "5.5", std::string(2001, '9') + ".9"), "5.5");
     EXPECT_EQ(Parsed("12EUR", "99C", kGerman), "12");
@@ -130,7 +136,8 @@ TEST(NumberFromText, TextsThatDoNotFit) {
         {"123", "99", "22062"},   {"1.23", "9.9", "22062"}, {"1.5", "9999", "22062"}, {"12,34", "9,999", "22062"},
         {"1 2", "9999", "22062"}, {"<12", "99PR", "22062"}, {"12>", "99PR", "22062"}, {"FG", "XX", "22062"},
         {"FFF", "XX", "22062"},   {"IIII", "RN", "22062"},  {"CMD", "RN", "22062"},   {"XCX", "RN", "22062"},
-        {"-", "99", "22062"},     {"12x", "99", "22062"},
+        {"-", "99", "22062"},     {"12x", "99", "22062"},   {"1,23", "9,999", "22062"}, {"   ", "XX", "22062"},
+        {"MMMM", "RN", "22062"},
         {"--1", "999", "22062"},  {"1e200", "", "22053"},   {"1e-200", "", "22054"},  {"1", "9Z", "22061"}};
     for (const auto& c : cases)
         EXPECT_EQ(Parsed(c.text, c.model), std::string("error ") + c.error) << c.text << " by " << c.model;
