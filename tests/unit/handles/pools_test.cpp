@@ -39,7 +39,7 @@ protected:
         ub4 length = 0;
         const sword code = OCISessionGet(env_, err, svc, auth, Text(name_), static_cast<ub4>(name_.size()), Text(tag),
                                          Length(tag), &came, &length, &found_, mode);
-        tag_.assign(came ? reinterpret_cast<char*>(came) : "", length);
+        tag_ = came ? std::string(reinterpret_cast<char*>(came), length) : "none";
         return code == OCI_SUCCESS_WITH_INFO ? FirstCode(err) : Answer(code, err);
     }
     // For threads.
@@ -79,7 +79,7 @@ protected:
 TEST_F(Pools, NumbersOfAPool) {
     const struct { ub4 least, most, step; sb4 answer; } cases[] = {
         {0, 0, 0, 24413}, {2, 1, 1, 24413}, {0, 2, 0, 24413}, {1, 0, 1, 24413}, {2, 2, 0, 0}, {0, 1, 5, 0},
-        {~0U, ~0U, 1, 24413}, {0, ~0U, ~0U, 24413}, {0, ~0U, 1, 0}};
+        {~0U, ~0U, 1, 24413}, {0, ~0U, ~0U, 24413}, {0, ~0U, 1, 0}, {0, 1, ~0U, 0}};
     for (const auto& c : cases) {
         EXPECT_EQ(Create(c.least, c.most, c.step), c.answer) << c.least << ' ' << c.most << ' ' << c.step;
         if (c.answer != 0) continue;
@@ -91,6 +91,10 @@ TEST_F(Pools, NumbersOfAPool) {
     EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "", "secret"), 24415);
     EXPECT_EQ(Create(1, 1, 1, kHomogeneous, nullptr, "wrong"), 1017);
     EXPECT_EQ(Destroy(), 24404);
+    ASSERT_EQ(Create(3, 3, 0, kHomogeneous | OCI_SPC_NO_RLB), 0);
+    EXPECT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
+    EXPECT_EQ(OpenCount(), 2u) << "what rests beyond the most is closed at once";
+    EXPECT_EQ(Destroy(), 0);
     // Steps, a surplus that goes as it comes back, and a pool that shrinks and grows.
     ASSERT_EQ(Create(1, 4, 2), 0);
     OCISvcCtx* svc[4] = {};
@@ -147,39 +151,49 @@ TEST_F(Pools, WhichSessionComes) {
         return came + '/' + std::to_string(OpenCount());
     };
     const struct { const char* tag; ub4 mode; const char* retag; const char* came; } cases[] = {
-        {nullptr, 0, "a", "found /1"}, {"a", 0, nullptr, "found a/1"}, {nullptr, 0, nullptr, "found /2"},
-        {"b", 0, "b", "/2"}, {"b", 0, nullptr, "found b/2"},
-        {"c", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "b/2"}, {"c", 0, "c", "/3"},
+        {nullptr, 0, "a", "found none/1"}, {"a", 0, nullptr, "found a/1"}, {nullptr, 0, nullptr, "found none/2"},
+        {"a", 0, nullptr, "found a/2"}, {"x", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "none/2"},
+        {"b", 0, "b", "none/2"}, {"b", 0, nullptr, "found b/2"},
+        {"c", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "b/2"}, {"c", 0, "c", "none/3"},
         // None without a tag is left: the one that rests longest makes room.
-        {"d", 0, "d", "/3"}, {"a", 0, "", "/3"}, {"b", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "/3"},
-        {nullptr, OCI_SESSGET_PURITY_NEW, nullptr, "found /3"}};
+        {"d", 0, "d", "none/3"}, {"a", 0, "", "none/3"}, {"b", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "none/3"},
+        {nullptr, OCI_SESSGET_PURITY_NEW, nullptr, "found none/3"}, {"e", 0, "e", "none/3"},
+        {"e", OCI_SESSGET_PURITY_NEW, "e", "none/3"}};
     int line = 0;
     for (const auto& c : cases) EXPECT_EQ(come_and_go(c.tag, c.mode, c.retag), c.came) << line++;
-    come_and_go("e", 0, "e");
-    auto* fresh = New<OCIAuthInfo>(OCI_HTYPE_AUTHINFO);
-    ub4 purity = 1;
-    EXPECT_EQ(Answer(OCIAttrSet(fresh, OCI_HTYPE_AUTHINFO, &purity, 0, OCI_ATTR_PURITY, err_)), 0);
-    OCISvcCtx* svc = nullptr;
-    EXPECT_EQ(Get(&svc, err_, kSpool, "e", fresh), 0);
-    EXPECT_FALSE(found_) << "asked for by the handle: one that nobody had";
-    EXPECT_EQ(Release(svc), 0);
+    auto* wish = New<OCIAuthInfo>(OCI_HTYPE_AUTHINFO);
+    for (ub4 purity : {2u, 1u}) {
+        EXPECT_EQ(Answer(OCIAttrSet(wish, OCI_HTYPE_AUTHINFO, &purity, 0, OCI_ATTR_PURITY, err_)), 0);
+        OCISvcCtx* svc = nullptr;
+        EXPECT_EQ(Get(&svc, err_, kSpool, "e", wish), 0);
+        EXPECT_EQ(found_, purity == 2) << "asked for by the handle: one that somebody had, or nobody";
+        EXPECT_EQ(Release(svc), 0);
+    }
 }
 
 TEST_F(Pools, SessionsOfSeveralUsers) {
     ASSERT_EQ(Create(2, 2, 0, OCI_DEFAULT), 0);
-    EXPECT_EQ(OpenCount(), 0u);
+    EXPECT_EQ(Create(2, 2, 0, OCI_SPC_REINITIALIZE), 0);
+    EXPECT_EQ(OpenCount(), 0u) << "nobody knows whose";
     OCISvcCtx *svc = nullptr, *other = nullptr;
     ASSERT_EQ(Get(&svc, err_), 0) << "of the pool's own user, who becomes the database's owner";
     ASSERT_EQ(Release(svc), 0);
     EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "wrong")), 1017) << "one of hers rests, but not for him";
+    ASSERT_EQ(Create(0, 4, 3, OCI_SPC_REINITIALIZE), 0);
     ASSERT_EQ(Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT), 0);
+    EXPECT_EQ(OpenCount(), 2u) << "nor for the system's user; steps are for the pool's own";
+    ASSERT_EQ(Create(0, 2, 1, OCI_SPC_REINITIALIZE), 0);
     ASSERT_EQ(Get(&other, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0);
     EXPECT_EQ(OpenCount(), 2u);
     ASSERT_EQ(Release(svc), 0);
     ASSERT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0) << "the system user's makes room";
     EXPECT_EQ(OpenCount(), 2u);
-    ASSERT_EQ(Release(svc), 0);
-    ASSERT_EQ(Release(other), 0);
+    EXPECT_EQ(Destroy(OCI_SPD_FORCE), 0);
+    EXPECT_EQ(Release(svc), 1012);
+    EXPECT_EQ(Release(other), 1012) << "all that are in use are taken away";
+    ASSERT_EQ(Create(0, 1, 1, kHomogeneous, "", ""), 0);
+    EXPECT_EQ(Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT), 0) << "as all of this pool are begun";
+    EXPECT_EQ(Release(svc), 0);
 }
 
 TEST_F(Pools, WhatAFullPoolAnswers) {
@@ -191,7 +205,10 @@ TEST_F(Pools, WhatAFullPoolAnswers) {
     EXPECT_EQ(Get(&second, err_), 24418);
     ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT), 0);
     ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20), 0);
+    const auto begun = std::chrono::steady_clock::now();
     EXPECT_EQ(Get(&second, err_), 24496);
+    const auto waited = std::chrono::steady_clock::now() - begun;
+    EXPECT_TRUE(waited >= 20ms && waited < 15s) << "milliseconds";
     ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_FORCEGET), 0);
     EXPECT_EQ(Get(&second, err_), 24417);
     EXPECT_EQ(OpenCount(), 2u);
@@ -203,6 +220,16 @@ TEST_F(Pools, WhatAFullPoolAnswers) {
     EXPECT_EQ(OpenCount(), 1u);
     std::this_thread::sleep_for(1100ms);
     EXPECT_EQ(OpenCount(), 0u);
+    ASSERT_EQ(Create(2, 2, 0, OCI_SPC_REINITIALIZE), 0);
+    for (OCISvcCtx** place : {&svc, &second}) ASSERT_EQ(Get(place, err_), 0);
+    ASSERT_EQ(Release(svc), 0);
+    std::this_thread::sleep_for(1100ms);
+    EXPECT_EQ(OpenCount(), 2u) << "no fewer than the least";
+    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 0), 0);
+    ASSERT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
+    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1), 0);
+    ASSERT_EQ(Release(second), 0);
+    EXPECT_EQ(OpenCount(), 1u) << "that which rested long, though the other has just come";
 }
 
 // Release and logoff commit; what is taken away rolls back; nothing of a former session reaches the next.
@@ -245,20 +272,73 @@ TEST_F(Pools, WhatASessionLeaves) {
     EXPECT_EQ(Release(svc), OCI_INVALID_HANDLE) << "the context has gone all the same";
     ASSERT_EQ(Create(1, 1, 1), 0) << "the handle serves anew";
     ASSERT_EQ(Get(&svc, err_), 0);
+    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u) << "of the handle, that was told before";
     EXPECT_EQ(Run(svc, "insert into t values(3)"), 0) << "force has rolled back";
     ASSERT_EQ(Release(svc, OCI_SESSRLS_DROPSESS), 0);
     EXPECT_EQ(OpenCount(), 0u);
+    for (const auto& [size, mode, cache] : {std::tuple(0u, kHomogeneous, 0u), {7u, kHomogeneous | OCI_SPC_STMTCACHE, 7u}}) {
+        ASSERT_EQ(Destroy(), 0);
+        ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_STMTCACHESIZE, size), 0);
+        ASSERT_EQ(Create(0, 1, 1, mode), 0);
+        svc = nullptr;
+        ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text(name_), static_cast<ub4>(name_.size()),
+                                   OCI_LOGON2_SPOOL)), 0);
+        EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), cache) << "only where it is wanted";
+        EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    }
+}
+
+// A newcomer stands behind who waits, though a session has just come back; a pool that grows has room for who waits.
+TEST_F(Pools, WhoWaitsComesFirst) {
+    ASSERT_EQ(Create(1, 1, 1), 0);
+    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT), 0);
+    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20000), 0);
+    auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+    int overtaken = 0;
+    for (int round = 0; round <= 10; ++round) {
+        OCISvcCtx *held = nullptr, *again = nullptr;
+        ASSERT_EQ(Get(&held, err_), 0);
+        std::atomic<bool> came = false;
+        std::thread waits([&] {
+            OCISvcCtx* svc = nullptr;
+            EXPECT_EQ(GetPlain(&svc, err, name_), 0);
+            came = true;
+            EXPECT_EQ(OCISessionRelease(svc, err, nullptr, 0, OCI_DEFAULT), 0);
+        });
+        std::this_thread::sleep_for(30ms);
+        if (round == 10) {
+            const auto grown = std::chrono::steady_clock::now();
+            EXPECT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
+            waits.join();
+            EXPECT_LT(std::chrono::steady_clock::now() - grown, 15s);
+            again = held;
+        } else {
+            EXPECT_EQ(Release(held), 0);
+            EXPECT_EQ(Get(&again, err_), 0);
+            overtaken += !came;
+        }
+        EXPECT_EQ(Release(again), 0);
+        if (waits.joinable()) waits.join();
+    }
+    EXPECT_LT(overtaken, 3) << "it may not have waited yet on a busy machine";
 }
 
 TEST_F(Pools, AServerAttachedToAConnectionPool) {
     auto* pool = New<OCICPool>(OCI_HTYPE_CPOOL);
     OraText* name = nullptr;
     sb4 length = 0;
-    const auto create = [&](const char* database, const char* password, ub4 mode) {
-        return Answer(OCIConnectionPoolCreate(env_, err_, pool, &name, &length, Text(database),
-                                              static_cast<sb4>(Length(database)), 0, 1, 1, Text(ann_), Length(ann_.c_str()),
-                                              Text(password), 6, mode));
+    sb4 lengths[] = {4, static_cast<sb4>(ann_.size()), 6};
+    const auto create = [&](const char* database, const char* password, ub4 mode, ub4 least = 0) {
+        lengths[0] = lengths[0] < 0 ? -1 : static_cast<sb4>(Length(database));
+        return Answer(OCIConnectionPoolCreate(env_, err_, pool, &name, &length, Text(database), lengths[0], least, 1, 1,
+                                              Text(ann_), lengths[1], Text(password), password ? lengths[2] : 0, mode));
     };
+    for (sb4& wrong : lengths) {
+        const sb4 right = std::exchange(wrong, -1);
+        EXPECT_EQ(create("work", "secret", 0), 24405);
+        wrong = right;
+    }
+    EXPECT_EQ(create("work", nullptr, 0), 1005);
     EXPECT_EQ(create("/nowhere/x.db", "secret", 0), 24400);
     EXPECT_EQ(create("work", "secret", 1), 24393);
     EXPECT_EQ(create("work", "secret", OCI_CPOOL_REINITIALIZE), 24395);
@@ -271,7 +351,7 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
     ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
     OCISession* sessions[] = {User(ann_.c_str(), "secret"), User(ann_.c_str(), "secret")};
-    ub1 no_wait = 1;
+    ub1 no_wait = 2;    // anything but 0
     ASSERT_EQ(Answer(OCIAttrSet(pool, OCI_HTYPE_CPOOL, &no_wait, 0, OCI_ATTR_CONN_NOWAIT, err_)), 0);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[0], OCI_CRED_RDBMS, 0)), 0);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[1], OCI_CRED_RDBMS, 0)), 24401);
@@ -285,6 +365,12 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[1], OCI_CRED_RDBMS, 0)), 0);
     EXPECT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
     EXPECT_EQ(counts(), 0u) << "a detach closes";
+    EXPECT_EQ(create("work", "secret", OCI_CPOOL_REINITIALIZE, 1), 0);
+    EXPECT_EQ(counts(), 10u) << "filled up to the least";
+    OCISvcCtx* refused = nullptr;
+    for (const auto& [mode, answer] : {std::pair(OCI_LOGON2_PROXY, 24419), {OCI_LOGON2_CPOOL | OCI_LOGON2_SPOOL, 24300}})
+        EXPECT_EQ(Answer(OCILogon2(env_, err_, &refused, Text(ann_), Length(ann_.c_str()), Text("secret"), 6, name,
+                                   static_cast<ub4>(length), static_cast<ub4>(mode))), answer);
     EXPECT_EQ(Answer(OCIConnectionPoolDestroy(pool, err_, 1)), 24394);
     EXPECT_EQ(Answer(OCIConnectionPoolDestroy(pool, err_, 0)), 0);
 }

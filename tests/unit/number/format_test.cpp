@@ -86,7 +86,7 @@ TEST(NumberToText, WhatDoesNotFitTheModel) {
 
 TEST(NumberToText, ModelsThatAreNone) {
     for (const char* model :
-         {"9LB9", "9L.9", "9EEEE.", "9EEEE,", "9EEEEEEEE", "9V9EEEE", ".9EEEE", "9G9.9", "9,9D9", "9.9,9", ".L9", "S99MI",
+         {"9LB9", "9L.", "9EEEE.", "9EEEE,", "9EEEEEEEE", "9V9EEEE", ".9EEEE", "9G9.9", "9,9D9", "9.9,9", ".L9", "S99MI",
           "Q",    "9 9", "9.9.9", ",99", "9,G9", "9D9.9", ".9,9",   "99MI9",   "MI99", "99MIS", "S99S",
           "9S9",  "S",   "$",     "$$9", "LC9",  "BB9",   "9EEEE9", "9,9EEEE", "EEEE", "9V9.9", "TM8",
           "TM99", "9TM", "XX9",   "X0",  "RNX",  "9FM",   "FM",     "FMFM9",   ".",    "G9",    "9LL9"})
