@@ -295,18 +295,20 @@ TEST_F(Pools, WhoWaitsComesFirst) {
     ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20000), 0);
     auto* err = New<OCIError>(OCI_HTYPE_ERROR);
     int overtaken = 0;
-    for (int round = 0; round <= 10; ++round) {
+    for (int round = 0; round <= 20; ++round) {
         OCISvcCtx *held = nullptr, *again = nullptr;
         ASSERT_EQ(Get(&held, err_), 0);
-        std::atomic<bool> came = false;
+        std::atomic<bool> begins = false, came = false;
         std::thread waits([&] {
             OCISvcCtx* svc = nullptr;
+            begins = true;
             EXPECT_EQ(GetPlain(&svc, err, name_), 0);
             came = true;
             EXPECT_EQ(OCISessionRelease(svc, err, nullptr, 0, OCI_DEFAULT), 0);
         });
-        std::this_thread::sleep_for(30ms);
-        if (round == 10) {
+        while (!begins) std::this_thread::yield();
+        std::this_thread::sleep_for(20ms);
+        if (round == 20) {
             const auto grown = std::chrono::steady_clock::now();
             EXPECT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
             waits.join();
@@ -320,7 +322,7 @@ TEST_F(Pools, WhoWaitsComesFirst) {
         EXPECT_EQ(Release(again), 0);
         if (waits.joinable()) waits.join();
     }
-    EXPECT_LT(overtaken, 3) << "it may not have waited yet on a busy machine";
+    EXPECT_LT(overtaken, 2) << "it may not have waited yet on a busy machine";
 }
 
 TEST_F(Pools, AServerAttachedToAConnectionPool) {
