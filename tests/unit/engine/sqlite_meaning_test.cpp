@@ -471,4 +471,26 @@ TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
     EXPECT_EQ(Rows("select c from t"), "   ;");
 }
 
+// The object of the row that took another's place is in the table; that of the other is gone.
+TEST_F(SqliteMeaning, ReplacedRowsReturnTheirObjects) {
+    MustRun("create table l(k integer primary key, c clob)", "insert into l values(1, 'old')", "commit");
+    auto* lob = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    auto* old = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    char data[] = "w";
+    const auto write = [&](OCILobLocator* to) {
+        ub4 amount = 1;
+        return Answer(OCILobWrite(svc, err, to, &amount, 3, data, 1, OCI_ONE_PIECE, nullptr, nullptr, 0, 0));
+    };
+    for (const char* sql : {"insert or replace into l values(1, 'nee') returning c into :1",
+                            "replace into l values(1, 'nee') returning c into :1"}) {
+        ASSERT_EQ(Query("select c from l for update", {{&old, -1, SQLT_CLOB}}), 0);
+        EXPECT_EQ(write(old), 0);
+        ASSERT_EQ(Ready(sql, {{&lob, -1, SQLT_CLOB}}), 0);
+        EXPECT_EQ(Execute(), 0);
+        EXPECT_EQ(write(lob), 0);
+        EXPECT_EQ(One("select c from l"), "new") << sql;
+        EXPECT_EQ(write(old), 22922) << sql;
+    }
+}
+
 }  // namespace

@@ -138,10 +138,21 @@ void UndoneWhole(World& w) {
     w.See(Count(*areas));
 }
 
+// The area tells of the failure, too.
+template <class Call>
+void Bridged(const Areas& areas, Call call) {
+    try {
+        call();
+    } catch (const Stopped&) {
+        EXPECT_EQ(areas.login.rc, kOutOfMemory);
+        throw;
+    }
+}
+
 void LoginToContext(World& w) {
     const auto areas = LogOn(w);
     OCISvcCtx* service = nullptr;
-    w.STEP(OCILdaToSvcCtx, &service, w.err, &areas->login);
+    Bridged(*areas, [&] { w.STEP(OCILdaToSvcCtx, &service, w.err, &areas->login); });
     w.AtEnd([service, &w] { return OCILogoff(service, w.err); });
     w.STEP(OCITransCommit, service, w.err, OCI_DEFAULT);
     w.See(areas->login.rc);
@@ -157,11 +168,11 @@ void ContextToLogin(World& w) {
         (void)OCILdaToSvcCtx(&back, w.err, &areas->login);
         return OCILogoff(service, w.err);
     });
-    w.STEP(OCISvcCtxToLda, service, w.err, &areas->login);
+    Bridged(*areas, [&] { w.STEP(OCISvcCtxToLda, service, w.err, &areas->login); });
     Number(w, "oopen", [&] { return oopen(&areas->cursor, &areas->login, nullptr, -1, -1, nullptr, -1); });
     Parse(w, *areas, "create table t (n integer)", 0);
     OCISvcCtx* back = nullptr;
-    w.STEP(OCILdaToSvcCtx, &back, w.err, &areas->login);
+    Bridged(*areas, [&] { w.STEP(OCILdaToSvcCtx, &back, w.err, &areas->login); });
     w.STEP(OCITransCommit, service, w.err, OCI_DEFAULT);
     w.See(back == service);
 }

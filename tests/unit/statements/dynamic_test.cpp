@@ -261,6 +261,7 @@ TEST_F(Dynamic, AnswersThatAreRefused) {
         EXPECT_EQ(Fetch(), c.out);
         EXPECT_EQ(RowsFetched(), c.out == 0 ? 1u : 0u);
         EXPECT_EQ(Fetch(), c.out) << "the next row";
+        EXPECT_EQ(Fetch(), 1403);
         ASSERT_EQ(Prepare("insert into t values('abc') returning a into :1"), 0);
         ASSERT_EQ(BindTo(1, nullptr, &callback), 0);
         EXPECT_EQ(Execute(), c.out);

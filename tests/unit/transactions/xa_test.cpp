@@ -208,6 +208,10 @@ TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
     const XID xid = Named("time", "x");
     ASSERT_EQ(Call(kStart, xid, TMNOFLAGS, 3), XA_OK);
     EXPECT_EQ(Run(nullptr, "insert into t values(1)"), 0);
+    auto* named = New<OCITrans>(OCI_HTYPE_TRANS);
+    XID name = xid;
+    EXPECT_EQ(Answer(OCIAttrSet(named, OCI_HTYPE_TRANS, &name, sizeof name, OCI_ATTR_XID, err_)), 0);
+    EXPECT_EQ(Answer(OCITransMultiPrepare(xaoSvcCtx(nullptr), 1, &named, &err_)), 2089) << "the manager's to prepare";
     ASSERT_EQ(Call(kEnd, xid, TMSUCCESS, 3), XA_OK);
     EXPECT_EQ(Change(), 0);
     EXPECT_EQ(OCITransRollback(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT), OCI_SUCCESS);
