@@ -105,6 +105,7 @@ TEST_F(Lobs, PiecesGoByRepeatedCalls) {
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
     EXPECT_EQ(Read(lob), "!24804");
     EXPECT_EQ(Write(other, 1, "x"), 24804);
+    EXPECT_EQ(Write(lob, 1, "x"), 24804) << "no piece of it";
     EXPECT_EQ(Write(lob, 1, "\xA4" "cd", OCI_NEXT_PIECE, &amount), OCI_NEED_DATA);    // the offset is not looked at
     EXPECT_EQ(Write(lob, 99, "e", OCI_LAST_PIECE, &amount), 0);
     EXPECT_EQ(amount, 6u);
@@ -142,10 +143,26 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     EXPECT_EQ(amount, 6u);
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 2), 1, nullptr, 0, &(taken = ""), Takes, 0, 0)), 0);
     EXPECT_EQ(taken, "3ab");
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 3, &(taken = ""), Takes, 0, 0)), 0);
+    EXPECT_EQ(taken, "1abc2de3\xC3\xA4");
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &amount, 1, room, 4, &(taken = "!"), Takes, 0, 0)), 24802);
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {}), Gives, 0, 0)),
               24802);
-    pieces = {"abc", "def"};
+    const struct { ub4 length; ub1 piece; sb4 answer; } odd[] = {
+        {9, OCI_LAST_PIECE, 24801}, {1, OCI_LAST_PIECE + 1, 24801}, {1, OCI_ONE_PIECE, 0}};
+    for (const auto& c : odd) {
+        const auto gives = [](dvoid* context, dvoid*, ub4* length, ub1* piece) -> sb4 {
+            const auto& told = *static_cast<decltype(&c)>(context);
+            *length = told.length, *piece = told.piece;
+            return OCI_CONTINUE;
+        };
+        EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 8, OCI_FIRST_PIECE,
+                                     const_cast<void*>(static_cast<const void*>(&c)), gives, 0, 0)), c.answer);
+    }
+    pieces = {"ab", "\xC3\xA4"};
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 4), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 0)
+        << "bytes are an amount, too";
+    pieces = {"abc", "de"};
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 4), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 24810);
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 7), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {"abc", "def"}),
                                  Gives, 0, 0)), 24811);
@@ -186,11 +203,15 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
     EXPECT_EQ(Query("select b from n", {{digits, 3, SQLT_CHR, &indicator}}), 1406);
     EXPECT_EQ(indicator, 80) << "of bytes as text, the digits";
     Fetch(other, "select n from n", SQLT_DBCLOB);
-    const struct { OCILobLocator* of; ub1 form; } forms[] = {{lob, SQLCS_IMPLICIT}, {binary, 0}, {other, SQLCS_NCHAR}};
+    const struct { OCILobLocator* of; ub1 form; ub2 set; } forms[] = {
+        {lob, SQLCS_IMPLICIT, 873}, {binary, 0, 0}, {other, SQLCS_NCHAR, 2000}};
     for (const auto& c : forms) {
         ub1 form = 9;
         EXPECT_EQ(Answer(OCILobCharSetForm(env, err, c.of, &form)), 0);
         EXPECT_EQ(form, c.form);
+        ub2 set = 9;
+        EXPECT_EQ(Answer(OCILobCharSetId(env, err, c.of, &set)), 0);
+        EXPECT_EQ(set, c.set);
     }
 }
 
@@ -254,6 +275,9 @@ TEST_F(Lobs, BufferedWritesWait) {
     ub4 amount = 0;
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &amount)), 22279);
     EXPECT_EQ(Read(lob, 10, 1, 4), "!24808");
+    EXPECT_EQ(Write(lob, 1, "x", OCI_FIRST_PIECE), 24808);
+    std::string taken;
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &amount, 1, nullptr, 0, &taken, Takes, 0, 0)), 24808);
     EXPECT_EQ(Write(lob, 20, "x"), 22282);
     EXPECT_EQ(Write(lob, 1, std::string(600000, 'x')), 22280);
     EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, 9)), 24801);
@@ -276,6 +300,10 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     EXPECT_EQ(Answer(OCILobFreeTemporary(svc, err, lob)), 22275);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
     EXPECT_EQ(Read(lob, 4, 0) + Read(lob, 4, kPast) + Read(lob, 4, 1, 0), "!24801!100!24803");
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(length = 1), 1, nullptr, 4, nullptr, nullptr, 0, 0)), 24803);
+    for (const auto& [amount, offset] : {std::pair(0u, 1u), {1u, 0u}})
+        EXPECT_EQ(Answer(OCILobErase(svc, err, lob, &(length = amount), offset)), 24801);
+    EXPECT_EQ(Write(lob, 1, {}), 24801);
     EXPECT_EQ(Write(lob, 0, "x"), 24801);
     EXPECT_EQ(Write(lob, kPast, "x"), 22925);
     EXPECT_EQ(Write(lob, 1, "x", OCI_NEXT_PIECE), 24801);
@@ -285,15 +313,23 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     char bytes[] = "\xC3\xB6xyz";
     EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, &far, nullptr, 1, bytes, 5, 0, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(Read(lob, 4), "4:\xC3\xB6xll") << "the amount in bytes";
+    oraub8 units = 0;
+    EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, &far, &units, 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
+    EXPECT_EQ(far * 10 + units, 32u) << "bytes and characters";
+    Fetch(other, "select b from l for update", SQLT_BLOB);
+    EXPECT_EQ(Answer(OCILobRead2(svc, err, other, &(far = 9), &(units = 1), 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
+    EXPECT_EQ(far, 3u) << "of bytes no characters count";
     EXPECT_EQ(Write(lob, 1, "h\xC3\xA4"), 0);
     far = ~oraub8{0};
     EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &(far = 1), ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)), 24281);
     OCISvcCtx* elsewhere = nullptr;
     ASSERT_EQ(Logon(&elsewhere), OCI_SUCCESS);
     EXPECT_EQ(Answer(OCILobGetLength(elsewhere, err, lob, &length)), 22927);
+    EXPECT_EQ(Answer(OCILobLocatorAssign(elsewhere, err, lob, &other)), 22927);
     OCILogoff(elsewhere, err);
     // A read in pieces holds the session's other large objects up, until its locator is gone.
     EXPECT_EQ(Read(lob, 11, 1, 4), "more 4:h\xC3\xA4l");
+    EXPECT_EQ(Read(other), "!24804");
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
     EXPECT_EQ(OCIDescriptorFree(lob, OCI_DTYPE_LOB), OCI_SUCCESS);
     Temporary(other);
