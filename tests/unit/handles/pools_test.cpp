@@ -322,7 +322,7 @@ TEST_F(Pools, WhoWaitsComesFirst) {
         EXPECT_EQ(Release(again), 0);
         if (waits.joinable()) waits.join();
     }
-    EXPECT_LT(overtaken, 2) << "it may not have waited yet on a busy machine";
+    EXPECT_LT(overtaken, 6) << "it may not have waited yet on a busy machine; without an order nearly all are";
 }
 
 TEST_F(Pools, AServerAttachedToAConnectionPool) {
