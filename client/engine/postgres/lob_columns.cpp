@@ -30,7 +30,8 @@ std::string ItemName(std::size_t index) { return "kelp_" + std::to_string(index 
 }  // namespace
 
 bool QuotesOtherwise(std::string_view sql) {
-    if (sql.find('\\') != std::string_view::npos) return true;
+    const bool has_escapes = sql.find("e'") != std::string_view::npos || sql.find("E'") != std::string_view::npos;
+    if (has_escapes && sql.find('\\') != std::string_view::npos) return true;
     for (std::size_t at = sql.find('$'); at != std::string_view::npos; at = sql.find('$', at + 1)) {
         if (at + 1 == sql.size() || !std::isdigit(static_cast<unsigned char>(sql[at + 1]))) return true;
     }

@@ -36,7 +36,7 @@ std::string BytesOf(const LobColumn& column, std::string_view value);
 // Their number; of an object of the server its own.
 std::string MeasureOf(const LobColumn& column, std::string_view value, bool server_has_utf8);
 
-// Whether a text has quotes of the server's own, which are left alone.
+// Whether a text may have quotes of the server's own, which are left alone: E'...' with backslashes, $$.
 bool QuotesOtherwise(std::string_view sql);
 
 // The statement whose result has the list's columns, then the measure of each item, then the row's table, place and

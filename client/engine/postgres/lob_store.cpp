@@ -248,8 +248,16 @@ std::shared_ptr<LobRow> PgLobStore::RowOf(const RowVersion& version) {
     return row;
 }
 
+PgLobStore::Rows::node_type PgLobStore::MakeRoom(LobRow& row) {
+    row.versions.reserve(row.versions.size() + 1);
+    rows_.reserve(rows_.size() + 1);
+    Rows room;
+    room.try_emplace(RowVersion());
+    return room.extract(room.begin());
+}
+
 // The row is of that version now. What was known to be of it is the same row from now on.
-void PgLobStore::Follow(std::shared_ptr<LobRow>& row, const RowVersion& version) {
+void PgLobStore::Follow(std::shared_ptr<LobRow>& row, const RowVersion& version, Rows::node_type room) {
     if (row->versions.back() == version) return;
     std::shared_ptr<LobRow> other;
     if (const auto found = rows_.find(version); found != rows_.end()) other = found->second.lock();
@@ -259,7 +267,9 @@ void PgLobStore::Follow(std::shared_ptr<LobRow>& row, const RowVersion& version)
     }
     std::erase(row->versions, version);
     row->versions.push_back(version);
-    rows_[version] = row;
+    room.key() = version;
+    room.mapped() = row;
+    if (auto known = rows_.insert(std::move(room)); !known.inserted) known.position->second = row;
 }
 
 // Rows that nobody holds are forgotten once in a while.
@@ -433,10 +443,11 @@ Status PgLobStore::Update(Draft& draft, const std::string& expression, std::stri
     const std::string sql = "update only " + table->name + " set " + draft.column->name + " = " + expression +
                             " where ctid = $" + (has_value ? "2" : "1") + "::tid and xmin = $" + (has_value ? "3" : "2") +
                             "::xid returning ctid, xmin::text::bigint";
+    Rows::node_type room = MakeRoom(*draft.row);
     Result changed;
     if (Status status = connection_.AskGuarded(sql, question.values, changed); !status.Ok()) return status;
     if (PQntuples(changed.get()) != 1) return Refused(errors::kNoLobValue);
-    Follow(draft.row, VersionIn(changed, 0, 0, version.table));
+    Follow(draft.row, VersionIn(changed, 0, 0, version.table), std::move(room));
     draft.row->checked_at = now_ + 1;    // behind the settling
     return {};
 }

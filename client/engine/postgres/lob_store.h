@@ -85,8 +85,12 @@ private:
         PgLobStore* store;
     };
 
+    using Rows = std::unordered_map<RowVersion, std::weak_ptr<LobRow>, RowVersionHash>;
+
     std::shared_ptr<LobRow> RowOf(const RowVersion& version);
-    void Follow(std::shared_ptr<LobRow>& row, const RowVersion& version);
+    // With room that was made for it before, a version that is nobody's yet needs no memory.
+    Rows::node_type MakeRoom(LobRow& row);
+    void Follow(std::shared_ptr<LobRow>& row, const RowVersion& version, Rows::node_type room);
     void Sweep();
     Lob* FindDraft(const LobRow& row, const LobColumn& column);
     Status Flush(Draft& draft);
@@ -107,7 +111,7 @@ private:
     PgConnection& connection_;
     const std::shared_ptr<ChunkFile> file_ = std::make_shared<ChunkFile>();
     const std::shared_ptr<Shared> shared_;
-    std::unordered_map<RowVersion, std::weak_ptr<LobRow>, RowVersionHash> rows_;
+    Rows rows_;
     std::size_t sweep_at_ = 64;
     std::vector<Draft> drafts_;
     std::uint64_t transaction_ = 0;       // the number of the one that runs, or ran last

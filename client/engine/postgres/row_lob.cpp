@@ -33,7 +33,7 @@ Status RowLob::CheckWrite() {
 Status RowLob::FindLatest(bool follows, RowVersion& latest, std::uint64_t& measure) {
     latest = row_->versions.back();
     if (Status status = Store().FindLatest(*column_, *row_, follows, latest, measure); status.Failed()) return status;
-    Store().Follow(row_, latest);
+    Store().Follow(row_, latest, Store().MakeRoom(*row_));
     seen_at_ = row_->checked_at = Store().Now();
     return {};
 }

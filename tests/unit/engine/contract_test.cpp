@@ -1149,6 +1149,7 @@ TEST_P(ServerObjects, AreMadeOfBytes) {
         {"insert into o values(5, %1, %2)", {View(Kind::bytes, "raw"), View(Kind::bytes, "b")}, "5,raw,b;"},
         {"insert into o values(5, %1, %2)", {Text("6869"), Text("6A")}, "5,hi,j;"},    // digits
         {"insert into o values(5, %1, empty_blob())", {Null()}, "5,null,null;"},
+        {"insert into o values(5, %1, '\\x6A'::bytea)", {View(Kind::bytes, "raw")}, "5,raw,j;"},
         {"insert into o(b, k, c) values(empty_blob(), 5, EMPTY_BLOB ( ))", {}, "5,null,null;"},
         {"insert into o(k, c) select k + 2, c from o where k = 3", {}, "5,three,null;"}};
     for (const auto& c : cases) {

@@ -49,6 +49,12 @@ bool Refused(Whose whose, const char* allocator, std::size_t size) {
     return true;
 }
 
+#ifdef FAULTS_IN_MALLOC
+bool RefusedInC(const char* allocator, std::size_t size) {
+    return plan.in_c && Refused(Whose::library, allocator, size);
+}
+#endif
+
 void* Uncounted(std::size_t size) {
 #ifdef FAULTS_IN_MALLOC
     return __libc_malloc(size);
@@ -139,19 +145,19 @@ long long SqliteBytes() { return sqlite3_memory_used(); }
 extern "C" {
 
 void* malloc(std::size_t size) {
-    if (!faults::Refused(faults::Whose::library, "malloc", size)) return __libc_malloc(size);
+    if (!faults::RefusedInC("malloc", size)) return __libc_malloc(size);
     errno = ENOMEM;
     return nullptr;
 }
 
 void* calloc(std::size_t count, std::size_t size) {
-    if (!faults::Refused(faults::Whose::library, "calloc", count * size)) return __libc_calloc(count, size);
+    if (!faults::RefusedInC("calloc", count * size)) return __libc_calloc(count, size);
     errno = ENOMEM;
     return nullptr;
 }
 
 void* realloc(void* block, std::size_t size) {
-    if (!faults::Refused(faults::Whose::library, "realloc", size)) return __libc_realloc(block, size);
+    if (!faults::RefusedInC("realloc", size)) return __libc_realloc(block, size);
     errno = ENOMEM;
     return nullptr;
 }

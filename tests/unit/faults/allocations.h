@@ -16,6 +16,7 @@ struct Plan {
     Whose whose;
     How how;
     long at;    // the number of the allocation, from 1; 0: none fails
+    bool in_c = true;    // malloc and its kin fail, too
 };
 
 // What became of the plan since it was set.

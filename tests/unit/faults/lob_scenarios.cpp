@@ -89,6 +89,23 @@ void ColumnGrows(World& w) {
     WriteColumn(w, "select c from l for update", SQLT_CLOB, 40, std::string(kLong, 'y'), kWidth, "70039", "43");
 }
 
+// Objects that the server keeps for itself, and what is bound becomes one.
+void TableOfObjects(World& w) {
+    if (w.OnServer()) w.Sql("create domain lo as oid");
+    w.Sql(w.OnServer() ? "create table o(b lo, c blob)" : "create table o(b blob, c blob)");
+}
+void Objects(World& w) {
+    w.Run("insert into o values(empty_blob(), x'00')");
+    char bytes[] = "some bytes";
+    w.Prepare("update o set b = :1");
+    w.Bind(1, {bytes, 10, SQLT_BIN});
+    w.Execute();
+    OCILobLocator* const lob = Select(w, "select b from o", SQLT_BLOB);
+    Write(w, lob, 6, "words and more of them");
+    w.STEP(OCILobTrim, w.svc, w.err, lob, 20);
+    SeeLob(w, lob);
+}
+
 void Copies(World& w) {
     OCILobLocator* const from = Select(w, "select c from l");
     OCILobLocator* const to = Temporary(w);
@@ -135,6 +152,7 @@ constexpr Scenario kScenarios[] = {
     {"LobTemporaryGrows", Ground::session, nullptr, TemporaryGrows, "5;h\xC3\xA4lf;141000;4;h  x;"},
     {"LobColumnInPlace", Ground::session, TableOfLobs, ColumnInPlace, "5;\x01" "ab\x04\x05;"},
     {"LobColumnGrows", Ground::session, TableOfLobs, ColumnGrows, "70040;"},
+    {"LobObjects", Ground::session, TableOfObjects, Objects, "20;some words and more ;"},
     {"LobCopies", Ground::session, TableOfLobs, Copies, "24;  value of s  value of s;24;zzvalue of s  value of s;"},
     {"LobBuffered", Ground::session, TableOfLobs, Buffered, "44;One and much more twoh that is h\xC3\xA4lf as long;"},
     {"LobPieces", Ground::session, nullptr, LobPieces, "3;"},

@@ -36,7 +36,8 @@ void World::OpenEnvironment() {
 }
 
 void World::OpenSession() {
-    const std::string database = Encoded(":memory:");
+    server_ = ServerOfTheTest();
+    const std::string database = Encoded(server_ ? server_->Url() : ":memory:");
     Must(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(database), Size(database)), "OCILogon");
     Must(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&quiet_), OCI_HTYPE_STMT, 0, nullptr), "OCIHandleAlloc");
 }

@@ -14,6 +14,7 @@
 #include "faults/allocations.h"
 #include "kelpci.h"
 #include "oci.h"
+#include "support/postgres_database.h"
 
 namespace faults {
 
@@ -141,6 +142,8 @@ public:
     }
     static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
 
+    [[nodiscard]] bool OnServer() const { return server_ != nullptr; }
+
     const ub4 mode;    // of the environment
     OCIEnv* env = nullptr;
     OCIError* err = nullptr;
@@ -163,6 +166,7 @@ private:
     std::string Encoded(std::string_view text) const;
 
     Ground ground_;
+    std::unique_ptr<PostgresDatabase> server_;
     OCIError* quiet_err_ = nullptr;
     OCIStmt* quiet_ = nullptr;
     std::vector<std::function<sword()>> ends_;

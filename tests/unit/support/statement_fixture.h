@@ -187,37 +187,13 @@ struct StatementCalls {
     std::string database_ = ":memory:";
 };
 
-// Functions of the embedded engine's own that the tests ask with, for the server.
-constexpr const char* kEmbeddedFunctions =
-    "create function join_texts(text, text, text) returns text language sql immutable as"
-    " $$ select case when $2 is null or $1 is null then coalesce($1, $2) else concat($1, $3, $2) end $$;"
-    "create function join_texts(text, text) returns text language sql immutable as $$ select join_texts($1, $2, ',') $$;"
-    "create aggregate group_concat(text) (sfunc = join_texts, stype = text);"
-    "create aggregate group_concat(text, text) (sfunc = join_texts, stype = text);"
-    "create function join_numbers(text, numeric) returns text language sql immutable as"
-    " $$ select join_texts($1, $2::text) $$;"
-    "create aggregate group_concat(numeric) (sfunc = join_numbers, stype = text);"
-    "create function hex(bytea) returns text language sql immutable as $$ select upper(encode($1, 'hex')) $$;"
-    "create function hex(text) returns text language sql immutable as $$ select hex(convert_to($1, 'UTF8')) $$;"
-    "create function zeroblob(int) returns bytea language sql immutable as $$ select decode(repeat('00', $1), 'hex') $$;"
-    "create function printf(text, int, text) returns text language sql immutable as $$ select repeat($3, $2) $$;"
-    "create function quote(text) returns text language sql immutable as $$ select quote_nullable($1) $$;"
-    "create function quote(timestamp) returns text language sql stable as $$ select quote_nullable($1::text) $$;"
-    "do $$ declare t text; begin foreach t in array array['bigint', 'numeric', 'float8', 'tid', 'refcursor'] loop"
-    " execute format('create function quote(%s) returns text language sql immutable as ''select $1::text''', t); end loop; end $$;"
-    "create function quote(bytea) returns text language sql immutable as $$ select 'X' || quote_literal(hex($1)) $$";
-
 class StatementTest : public testing::Test, protected StatementCalls {
 protected:
     explicit StatementTest(ub4 mode = OCI_DEFAULT) { mode_ = mode; }
 
     void SetUp() override {
-        const char* const engine = std::getenv("KELP_TEST_ENGINE");
-        if (engine && std::string_view(engine) == "postgres") {
-            server_ = std::make_unique<PostgresDatabase>();
-            database_ = server_->Url();
-            server_->RunHere(kEmbeddedFunctions);
-        }
+        server_ = ServerOfTheTest();
+        if (server_) database_ = server_->Url();
         ASSERT_EQ(OCIEnvCreate(&env, mode_, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
         err = New<OCIError>(OCI_HTYPE_ERROR);
         ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
