@@ -134,24 +134,6 @@ int HexText(const Datum& datum, Workspace& workspace, View& text) {
     return 0;
 }
 
-// "YYYY-MM-DD ..." of the common era as DD-MON-RR, without reading more than that takes. False: another form.
-bool ShortDate(View engine_text, char* text) {
-    constexpr char kMonths[] = "JANFEBMARAPRMAYJUNJULAUGSEPOCTNOVDEC";
-    if (engine_text.size() != 19) return false;
-    if (engine_text[4] != '-' || engine_text[7] != '-' || engine_text[10] != ' ') return false;
-    for (const std::size_t digit : {0u, 1u, 2u, 3u, 5u, 6u, 8u, 9u})
-        if (engine_text[digit] < '0' || engine_text[digit] > '9') return false;
-    const int month = (engine_text[5] - '0') * 10 + engine_text[6] - '0';
-    if (month < 1 || month > 12) return false;
-    text[0] = engine_text[8];
-    text[1] = engine_text[9];
-    text[2] = text[6] = '-';
-    std::copy_n(kMonths + (month - 1) * 3, 3, text + 3);
-    text[7] = engine_text[2];
-    text[8] = engine_text[3];
-    return true;
-}
-
 View ModelOf(ColumnClass column) {
     switch (column) {
         case ColumnClass::timestamp: return date::kTimestampModel;
@@ -188,27 +170,9 @@ int ModelText(const date::DateTime& value, Workspace& workspace, View& text) {
     return error;
 }
 
-// In the default model of the column's type. A time alone is shown as the engines write it.
+// In the default model of the column's type.
 int TimestampText(const Datum& datum, Workspace& workspace, View& text) {
-    const date::DateTime value = datum.Timestamp();
-    if (value.month != 0) return ModelText(value, workspace, text);
-    constexpr std::size_t kDatePart = 11;    // with the blank
-    const View whole(workspace.small.data(), date::ToEngineText(value, workspace.small.data()));
-    text = whole.substr(std::min(kDatePart, whole.size()));
-    return 0;
-}
-
-// The same of a text in a column of dates; what is no date, a time alone included, stays as it is.
-int DateText(const Datum& datum, Workspace& workspace, View& text) {
-    constexpr std::size_t kShortDate = 9;
-    char* begin = workspace.small.data();
-    if (ModelOf(workspace.column).data() == date::kDateModel.data() && ShortDate(datum.Text(), begin)) {
-        text = {begin, kShortDate};
-        return 0;
-    }
-    date::DateTime value;
-    if (date::FromEngineText(datum.Text(), &value) != 0 || value.month == 0) return OwnText(datum, workspace, text);
-    return ModelText(value, workspace, text);
+    return ModelText(datum.Timestamp(), workspace, text);
 }
 
 int RowIdText(const Datum& datum, Workspace& workspace, View& text) {
@@ -349,12 +313,15 @@ int PutLob(const Datum& datum, Workspace& workspace, Target& target) {
     Datum value;
     std::uint64_t length = 0;
     if (const int error = ReadLob(datum, workspace.lobs.get(), most, workspace.content, value, length)) return error;
+    const bool is_hex = as_text && value.kind != engine::Kind::text;
+    const bool is_unhexed = !as_text && value.kind == engine::Kind::text;
+    const bool is_part = length > value.length;
+    // The single digit of an odd count is the first, however much is read: what is left away are pairs.
+    if (is_unhexed && is_part) value.length -= static_cast<std::uint32_t>((length - value.length) % 2);
     View form;
     if (const int error = LobForm(value, as_text, workspace, form)) return error;
     const int error = put(form, workspace, target);
-    const bool is_hex = as_text && value.kind != engine::Kind::text;
-    const bool is_unhexed = !as_text && value.kind == engine::Kind::text;
-    if (length > value.length) target.whole = is_hex ? length * 2 : is_unhexed ? (length + 1) / 2 : length;
+    if (is_part) target.whole = is_hex ? length * 2 : is_unhexed ? (length + 1) / 2 : length;
     return error;
 }
 
@@ -364,7 +331,7 @@ constexpr ByOrigin<OutConverter> kTextRow = {
     Through<View, DecimalText, put>, Through<View, OwnText, put>,     Through<View, HexText, put>,
     Through<View, TimestampText, put>, PutLob<put, true>,             Through<View, RowIdText, put>,
     NoConversion,                    Through<View, NumericText, put>, Through<View, BinaryRealText, put>,
-    Through<View, SingleRealText, put>, Through<View, DateText, put>};
+    Through<View, SingleRealText, put>, Through<View, OwnText, put>};
 
 template <auto put>
 constexpr ByOrigin<OutConverter> kBytesRow = {
@@ -394,7 +361,7 @@ const ByOrigin<OutConverter> kToRaw = kBytesRow<PutRaw>;
 
 const ByOrigin<Renderer> kWholeText = {NoText, IntegerText, RealText, DecimalText, OwnText, HexText,
                                        TimestampText, WholeLob<true>, RowIdText, NoText, NumericText, BinaryRealText, SingleRealText,
-                                       DateText};
+                                       OwnText};
 const ByOrigin<Renderer> kWholeBytes = {NoText, NoText, NoText, NoText, BytesOfHex, OwnText,
                                         NoText, WholeLob<false>, NoText, NoText, NoText, NoText, NoText, NoText};
 

@@ -99,6 +99,7 @@ TEST_F(DateCalls, TextsInUtf16) {
     EXPECT_EQ(Answer(OCIDateFromText(err_, Text(u"\xD800x"), 4, nullptr, 0, nullptr, 0, &out)), 24501);
     OCIDateTime* moment = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
     EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, moment, 2024, 7, 1, 0, 0, 0, 0, Text(u"Europe/Paris"), 24)), 0);
+    EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, moment, 2024, 7, 1, 0, 0, 0, 0, Text(u"\xD800x"), 4)), 24501);
 }
 
 TEST_F(DateCalls, TypesHaveTheirParts) {

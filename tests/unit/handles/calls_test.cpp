@@ -324,6 +324,7 @@ TEST_F(CallsTest, PasswordChange) {
     ASSERT_EQ(Answer(OCIAttrSet(other, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
     EXPECT_EQ(change(other, "ann", "three", "four", 0), 1012);
     EXPECT_EQ(change(other, "ann", "wrong", "four", OCI_AUTH), 1017);
+    EXPECT_EQ(change(other, nullptr, "three", "four", OCI_AUTH), 1017);
     EXPECT_EQ(change(other, "ann", "three", std::string(1000, 'x').c_str(), OCI_AUTH), 1017);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012) << "nor is the session left";
     EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 0);

@@ -130,6 +130,17 @@ sb4 Gives(dvoid* context, dvoid* room, ub4* length, ub1* piece) {
     return OCI_CONTINUE;
 }
 
+// The second piece is given elsewhere.
+sb4 GivesElsewhere(dvoid* context, dvoid* room, oraub8* length, ub1* piece, dvoid** changed, oraub8* changed_length) {
+    auto& elsewhere = *static_cast<std::string*>(context);
+    const bool second = room == elsewhere.data();
+    *piece = second ? OCI_LAST_PIECE : OCI_NEXT_PIECE;
+    *changed = elsewhere.data();
+    *changed_length = elsewhere.size();
+    *length = std::string_view(second ? "abc\xC3\xA4" : "xy").copy(static_cast<char*>(room), *length);
+    return OCI_CONTINUE;
+}
+
 TEST_F(Lobs, PiecesGoThroughCallbacks) {
     Temporary(lob);
     std::vector<std::string> pieces{"abc", "", "de\xC3", "\xA4"};
@@ -166,6 +177,16 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 4), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 24810);
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 7), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {"abc", "def"}),
                                  Gives, 0, 0)), 24811);
+    std::string elsewhere(8, '#');
+    oraub8 bytes = 0, characters = 0;
+    Temporary(other);
+    EXPECT_EQ(Write(other, 1, "\xC3\xA4"), 0);
+    EXPECT_EQ(Answer(OCILobWriteAppend2(svc, err, other, &bytes, &characters, room, 2, OCI_FIRST_PIECE, &elsewhere,
+                                        GivesElsewhere, 0, 0)), 0);
+    EXPECT_EQ(bytes * 10 + characters, 76u);
+    EXPECT_EQ(Answer(OCILobWriteAppend(svc, err, other, &(amount = 0), elsewhere.data(), 1, OCI_ONE_PIECE, nullptr, nullptr,
+                                       0, 0)), 0);
+    EXPECT_EQ(Read(other), "8:\xC3\xA4xyabc\xC3\xA4" "a");
 }
 
 TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
@@ -194,14 +215,14 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
     for (const auto& c : refused)
         EXPECT_EQ(Answer(OCILobCopy(svc, err, c.to, c.from, c.amount, c.at, c.source)), c.answer) << c.answer;
     EXPECT_EQ(Read(binary), std::string("3:\1\2\3"));
+    char bytes[4];
+    oraub8 count = 0;    // of characters, which bytes are not counted by
+    EXPECT_EQ(Answer(OCILobRead2(svc, err, binary, nullptr, &count, 1, bytes, 4, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
+    EXPECT_EQ(count, 3u);
     ASSERT_EQ(Write(other, 1, std::string(100000, 'a')), 0);
     EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 100000, 1, 1)), 0);    // in several steps
     EXPECT_EQ(LengthOf(lob), 100000u);
-    MustRun("create table n(n nclob, b blob)", "insert into n values('x', x'00000000000000000000000000000000000000000000000000000000000000000000000000000000')");
-    char digits[3];
-    sb2 indicator = 0;
-    EXPECT_EQ(Query("select b from n", {{digits, 3, SQLT_CHR, &indicator}}), 1406);
-    EXPECT_EQ(indicator, 80) << "of bytes as text, the digits";
+    MustRun("create table n(n nclob)", "insert into n values('x')");
     Fetch(other, "select n from n", SQLT_DBCLOB);
     const struct { OCILobLocator* of; ub1 form; ub2 set; } forms[] = {
         {lob, SQLCS_IMPLICIT, 873}, {binary, 0, 0}, {other, SQLCS_NCHAR, 2000}};
@@ -213,6 +234,50 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
         EXPECT_EQ(Answer(OCILobCharSetId(env, err, c.of, &set)), 0);
         EXPECT_EQ(set, c.set);
     }
+}
+
+// As bytes or their digits, no more than there is room for; what a locator of the other kind would be filled with is refused.
+TEST_F(Lobs, ValuesInPlainAreas) {
+    std::string digits = "1", zeros(80, '0');    // an odd count, whose first digit is a byte of its own
+    for (int pair = 0; pair < 50; ++pair) digits += "45";
+    MustRun("create table n(c clob, b blob)", "insert into n values('" + digits + "', x'" + zeros + "')");
+    const struct { const char* sql; ub2 type; sb4 size, answer; std::string_view area; sb2 indicator; } cases[] = {
+        {"select b from l", SQLT_BIN, 4, 0, "\1\2\3#", 0},
+        {"select b from l", SQLT_VBI, 4, 1406, {"\2\0\1\2", 4}, 3}, {"select b from l", SQLT_CHR, 6, 0, "010203", 0},
+        {"select b from n", SQLT_BIN, 2, 1406, {"\0\0", 2}, 40}, {"select c from n", SQLT_BIN, 2, 1406, "\x01\x45", 51},
+        {"select c from l", SQLT_BIN, 4, 1465, "####", 9}, {"select b from n", SQLT_CHR, 3, 1406, "000", 80}};
+    for (const auto& c : cases) {
+        std::string area(static_cast<std::size_t>(c.size), '#');
+        sb2 indicator = 9;
+        EXPECT_EQ(Query(c.sql, {{area.data(), c.size, c.type, &indicator}}), c.answer);
+        EXPECT_EQ(area, c.area) << c.sql;
+        EXPECT_EQ(indicator, c.indicator) << c.sql;
+    }
+    const struct { const char* sql; ub2 type; } refused[] = {
+        {"select c from l", SQLT_BLOB}, {"select b from l", SQLT_CLOB}, {"select 'abc' from dual", SQLT_BLOB}, {"select x'01' from dual", SQLT_CLOB}};
+    for (const auto& c : refused) EXPECT_EQ(Query(c.sql, {Locator(lob, c.type)}), 932) << c.sql;
+    Fetch(lob, "select x'0102' from dual", SQLT_BLOB);
+    EXPECT_EQ(Read(lob), "2:\1\2");
+}
+
+TEST_F(Lobs, EmptyOnesOfTheApplication) {
+    for (ub4 value : {1u, 0u})
+        EXPECT_EQ(Answer(OCIAttrSet(lob, OCI_DTYPE_LOB, &value, 0, OCI_ATTR_LOBEMPTY, err)), value == 0 ? 0 : 24328);
+    boolean flag = TRUE;
+    EXPECT_EQ(Answer(OCILobIsTemporary(env, err, lob, &flag)), 0);
+    EXPECT_EQ(flag, FALSE);
+    EXPECT_EQ(Write(lob, 1, "x"), 22275);
+    for (const ub2 type : {SQLT_CLOB, SQLT_BLOB}) {
+        char seen[8] = "";
+        ASSERT_EQ(Ready("select quote(:1) from dual", {Locator(lob, type)}), 0);
+        ASSERT_EQ(Define(1, Text(seen)) + Execute(1), 0);
+        EXPECT_STREQ(seen, type == SQLT_CLOB ? "''" : "X''");
+    }
+    ASSERT_EQ(Ready("insert into l values(9, :1, :2)", {Locator(lob), Locator(lob, SQLT_BLOB)}), 0);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(One("select length(c) + 10 * length(b) from l where k = 9"), "0");
+    Fetch(lob, "select b from l where k = 9", SQLT_BLOB);
+    EXPECT_EQ(LengthOf(lob), 0u);
 }
 
 TEST_F(Lobs, BindsAndReturningTakeLocators) {
@@ -299,6 +364,8 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     Fetch(lob);
     EXPECT_EQ(Answer(OCILobFreeTemporary(svc, err, lob)), 22275);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
+    EXPECT_EQ(Answer(OCILobErase(svc, err, lob, nullptr, 1)), 21560);
+    EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, nullptr, nullptr, 1, room, 9, 0, nullptr, nullptr, 0, 0)), 21560);
     EXPECT_EQ(Read(lob, 4, 0) + Read(lob, 4, kPast) + Read(lob, 4, 1, 0), "!24801!100!24803");
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(length = 1), 1, nullptr, 4, nullptr, nullptr, 0, 0)), 24803);
     for (const auto& [amount, offset] : {std::pair(0u, 1u), {1u, 0u}})

@@ -86,6 +86,18 @@ TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
     EXPECT_EQ(Recorded(), 21560);
     EXPECT_EQ(OCINumberAbs(error_, &value, nullptr), OCI_ERROR);
     EXPECT_EQ(Recorded(), 21560);
+    const OCINumber* values[] = {&value, nullptr};
+    double reals[2] = {};
+    EXPECT_EQ(OCINumberToRealArray(error_, values, 2, 8, reals), OCI_ERROR);
+    EXPECT_EQ(Recorded(), 21560);
+    EXPECT_EQ(reals[0], -1234.5) << "what comes before is converted";
+    const OCINumber small = Number("255");
+    const std::string wide = Bytes(std::string(300, 'X'));    // longer than most texts
+    std::string shown(1000, '#');
+    size = 1000;
+    EXPECT_EQ(OCINumberToText(error_, &small, reinterpret_cast<const OraText*>(wide.data()), static_cast<ub4>(wide.size()),
+                              nullptr, 0, &size, reinterpret_cast<OraText*>(shown.data())), OCI_SUCCESS);
+    EXPECT_EQ(shown.substr(0, size), Bytes(std::string(299, ' ') + "FF"));
     OCINumber result;
     EXPECT_EQ(FromText(Bytes("1x"), Bytes("99"), &result), OCI_ERROR);
     EXPECT_EQ(Recorded(), 22062);

@@ -560,10 +560,15 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
     EXPECT_EQ(Number(OCISvcCtxToLda(service, err, &lda)), 1015);
     ASSERT_EQ(ExecuteOn(service, "insert into t values (1, null)"), 0);
     ASSERT_EQ(OCISvcCtxToLda(service, err, &lent), 0);
+    OCISession* session = nullptr;
+    EXPECT_EQ(OCIAttrGet(service, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err), 0);
+    EXPECT_EQ(Number(OCISessionEnd(service, err, static_cast<OCISession*>(New(OCI_HTYPE_SESSION)), 0)), 1012);
     for (const sword number : {Number(OCISvcCtxToLda(service, err, &unknown)), ExecuteOn(service, "delete from t"),
                                Number(OCITransCommit(service, err, 0)), Number(OCITransRollback(service, err, 0)),
                                Number(OCIPing(service, err, 0)), Number(OCIBreak(service, err)),
-                               Number(OCILogoff(service, err)), Number(name(&service))}) {
+                               Number(OCILogoff(service, err)), Number(name(&service)),
+                               Number(OCISessionEnd(service, err, session, 0)),
+                               Number(OCIPasswordChange(service, err, T("u"), 1, T("o"), 1, T("n"), 1, OCI_AUTH))}) {
         EXPECT_EQ(number, 24406);
     }
     ub1 current = 9;

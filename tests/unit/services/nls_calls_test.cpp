@@ -40,7 +40,11 @@ TEST_F(NlsCalls, TextsAreConverted) {
     }
     ub2 units[4] = {};
     char bytes[8] = "";
-    size_t length = 0;
+    size_t length = 7;
+    EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 31, bytes, 8, 873, nullptr, 1, &length)), 21560);
+    EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 31, nullptr, 8, 873, "a", 1, &length)), 21560);
+    EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 31, bytes, 8, 873, nullptr, 0, &length)), 0);
+    EXPECT_EQ(length, 0u);
     Nls(178);
     EXPECT_EQ(OCICharSetToUnicode(env_, units, 4, Text("a\x80"), 2, &length), OCI_SUCCESS);
     EXPECT_EQ(units[1] * 10 + length, 0x20ACu * 10 + 2);
@@ -51,6 +55,9 @@ TEST_F(NlsCalls, TextsAreConverted) {
 }
 
 TEST_F(NlsCalls, NamesAndSettings) {
+    sb4 fixed = 9;
+    EXPECT_EQ(Answer(OCINlsNumericInfoGet(env_, err_, &fixed, OCI_NLS_CHARSET_FIXEDWIDTH)), 0);
+    EXPECT_EQ(fixed, 0);
     Nls(178, 1000);
     const struct { ub2 id; const char* name; } sets[] = {
         {1, "US7ASCII"}, {31, "WE8ISO8859P1"}, {46, "WE8ISO8859P15"}, {170, "EE8MSWIN1250"}, {171, "CL8MSWIN1251"},
@@ -78,6 +85,7 @@ TEST_F(NlsCalls, NamesAndSettings) {
         EXPECT_EQ(Answer(OCINlsNumericInfoGet(env_, err_, &value, c.item)), 0);
         EXPECT_EQ(value, c.value) << c.item;
     }
+    EXPECT_EQ(Answer(OCINlsNumericInfoGet(env_, err_, nullptr, 93)), 21560);
     ub2 id = 0;
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 0, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
     EXPECT_GT(id, 0);
@@ -85,6 +93,10 @@ TEST_F(NlsCalls, NamesAndSettings) {
     OCIEnv* none = nullptr;
     EXPECT_EQ(OCIEnvNlsCreate(&none, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr, 7, 0), OCI_ERROR);
     EXPECT_EQ(none, nullptr);
+    Nls(2000);
+    for (const size_t room : {9u, 10u})
+        EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), room, 871), room == 10 ? OCI_SUCCESS : OCI_ERROR);
+    EXPECT_EQ(std::string_view(text, 10), std::string_view("\0U\0T\0F\0" "8\0", 10));
 }
 
 TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {

@@ -95,6 +95,11 @@ TEST_F(Executing, RowsThatFail) {
     EXPECT_EQ(rc, OCI_SUCCESS_WITH_INFO);
     EXPECT_EQ(Answer(rc), 24381);
     EXPECT_EQ(RowCount(), 3u);
+    dvoid* row = err;    // which is no place for one of its own failures
+    auto* const other = New<OCIError>(OCI_HTYPE_ERROR);
+    EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, 0), OCI_SUCCESS);
+    EXPECT_NE(row, err);
+    EXPECT_EQ((StatementCalls{env, other}.Answer(OCIParamGet(err, OCI_HTYPE_ERROR, other, nullptr, 0))), 21560);
     EXPECT_EQ(BatchErrors(), "1 in 1, 1 in 3, ");
 }
 

@@ -122,7 +122,10 @@ TEST_F(XaCalls, ArgumentsAreJudgedFirst) {
     EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, 1, 1, TMSTARTRSCAN), XAER_INVAL);
     EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, -1, 1, TMSTARTRSCAN), XAER_INVAL);
     EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, 0, 1, TMSTARTRSCAN), 0);
-    EXPECT_EQ(rmXaSwitch.xa_complete_entry(nullptr, nullptr, 1, TMNOFLAGS), XAER_INVAL);
+    int handle = 0, result = 0;
+    EXPECT_EQ(rmXaSwitch.xa_complete_entry(nullptr, &result, 1, TMNOFLAGS), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_complete_entry(&handle, nullptr, 1, TMNOFLAGS), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_complete_entry(&handle, &result, 1, TMNOFLAGS), XAER_PROTO);
     EXPECT_EQ(XaGetInfo(1, nullptr), XAER_INVAL);
     SQLCA unused;
     EXPECT_EQ(XaGetInfo(77, &unused), XAER_INVAL);
@@ -149,6 +152,14 @@ TEST_F(XaCalls, InfoStrings) {
     EXPECT_EQ(Open(4, "SqlNet=four"), XA_OK);
     EXPECT_EQ(xaoSvcCtx(nullptr), nullptr);
     for (const int rmid : {3, 4}) EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, rmid, TMNOFLAGS), XA_OK);
+    // Names are in the mode of the process.
+    EXPECT_EQ(OCIInitialize(OCI_UTF16, nullptr, nullptr, nullptr, nullptr), OCI_SUCCESS);
+    EXPECT_EQ(Open(3, "DB=\xC4\x80z+SqlNet=three"), XA_OK);
+    EXPECT_NE(xaoEnv(Text(u"\x100z")), nullptr);
+    EXPECT_EQ(xaoEnv(Text(u"\x100")), nullptr);
+    EXPECT_EQ(xaoEnv(Text(u"\xD800")), nullptr);
+    EXPECT_EQ(OCITerminate(OCI_DEFAULT), OCI_SUCCESS);
+    EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
 }
 
 TEST_F(XaCalls, ScansGoOnWhereTheyWere) {

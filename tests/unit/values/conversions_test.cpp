@@ -89,11 +89,18 @@ TEST_F(Conversions, NumbersAsText) {
         {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"},
         {"1e39", "1000000000000000000000000000000000000000"}, {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"},
         {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf", "!1426"}, {"-9e999", "-Inf", "!1426"}, {"0.1 + 0.2", ".3"},
-        {"4.35 * 100", "435"}, {"1 / 3.0", ".333333333333333", ".33333333333333333333"},
+        {"4.35 * 100", "435"}, {"-0.00001", "-.00001"}, {"1 / 3.0", ".333333333333333", ".33333333333333333333"},
         {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"}};
     for (const auto& c : cases)
         EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), OnServer() && c.on_server ? c.on_server : c.text)
             << c.expression;
+    if (OnServer()) {
+        EXPECT_EQ(One("select 'NaN'::float8"), "Nan");
+    } else {
+        char texts[2][8] = {};
+        EXPECT_EQ(Query("select 1 from dual union all select 'one' from dual", {Text(texts)}, 2), 0);
+        EXPECT_STREQ(texts[1], "one") << "what is no number stays as it is";
+    }
 }
 
 TEST_F(Conversions, Integers) {
@@ -317,6 +324,7 @@ TEST_F(Conversions, Intervals) {
     EXPECT_EQ(One("select ds from spans order by ds desc"), "+0010 00:00:00.000");
     EXPECT_EQ(One("select ds from spans where ds = '-1 12:30:0.001'"), "-0001 12:30:00.001");
     EXPECT_EQ(One("select count(*) from spans where ym > '0-10'"), "2");
+    EXPECT_EQ(Query("select '1 0:0:0' from dual", {{&stmt, 8, SQLT_INTERVAL_DS}}), 21710);
     const struct { const char* sql; sb4 answer; } refused[] = {
         {"insert into spans(ym) values('1000-0')", 1873}, {"insert into spans(ym) values('soon')", 1867},
         {"insert into spans(ym) values(12)", 932}, {"insert into spans(ds) values('1-2')", 1867}};
@@ -433,6 +441,20 @@ TEST_F(Conversions, StringsAndRaws) {
     EXPECT_EQ(In(Raw(raw), SQLT_LVB), "X'00FF'");
     EXPECT_EQ(In(Raw<void*>(nullptr), SQLT_VST), "NULL");
     EXPECT_EQ(In(Raw(raw), SQLT_VST), "!21710");
+    EXPECT_EQ(Query("select 'abc' from dual", {{&raw, 8, SQLT_VST}}), 21710);
+}
+
+TEST_F(Conversions, RowIdsOfTexts) {
+    auto* place = NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
+    const struct { const char *expression, *hex; } cases[] = {
+        {"' AAAP//AAAAAAAAAAAB '", "FFFF0000000000000001"}, {"'AAAQAAAAAAAAAAAAAB'", "!1410"}, {"'AAAAAAAAAAAAAAAAA'", "!1410"}};
+    for (const auto& c : cases) {
+        const std::string area = Out(c.expression, SQLT_RID, 10);
+        EXPECT_EQ(area[0] == '!' ? area : Hex(area), c.hex) << c.expression;
+    }
+    EXPECT_EQ(length_, 0);
+    ASSERT_EQ(Query("select 'AAAQAAAAAAAAAAAAAB' from dual", {{&place, 8, SQLT_RDD}}), 0);
+    EXPECT_EQ(In(Raw(place), SQLT_RDD), "!1410") << "a table that no engine numbers so";
 }
 
 TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
@@ -517,6 +539,9 @@ TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
     in = {'\0', '\xD8'};
     ASSERT_EQ(Bind(1, {in.data(), 2, SQLT_CHR}), 0);
     EXPECT_EQ(Execute(1), 24365) << "half a pair";
+    ub2 length = 4;    // without its zero
+    EXPECT_EQ(In(Encoded("xy"), SQLT_STR, "length(:1)"), "!1480");
+    EXPECT_EQ(In(Encoded("xy"), SQLT_STR, "length(:1)", &length).substr(0, 1), "2");
 }
 
 TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
@@ -535,6 +560,24 @@ TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
     ASSERT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 1, 1, &found, names, lengths, nullptr, nullptr, nullptr, nullptr)),
               0);
     EXPECT_EQ(std::string(reinterpret_cast<char*>(names[0]), lengths[0]), Encoded("NAME"));
+    const std::string_view half("\0\xD8", 2);
+    const std::string sql = Encoded("select 1 from dual");
+    OCIBind* bind = nullptr;
+    OCIStmt* made = nullptr;
+    EXPECT_EQ(Answer(OCIBindByName(stmt, &bind, err, Bytes(half), 2, value, 8, SQLT_STR, nullptr, nullptr, nullptr, 0,
+                                   nullptr, OCI_DEFAULT)), 24501);
+    EXPECT_EQ(Answer(OCIStmtPrepare2(svc, &made, err, Bytes(half), 2, nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT)), 24501);
+    EXPECT_EQ(Answer(OCIStmtPrepare2(svc, &made, err, Bytes(sql), Size(sql), Bytes(half), 2, OCI_NTV_SYNTAX, OCI_DEFAULT)),
+              24501);
+    EXPECT_EQ(Answer(OCIStmtRelease(stmt, err, Bytes(half), 2, OCI_DEFAULT)), 24501);
+    auto* row = NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
+    ASSERT_EQ(Query("select 'AAAAAAAAAAAAAAAAAB' from dual", {{&row, 8, SQLT_RDD}}), 0);
+    for (const ub2 room : {37, 38}) {
+        std::string shown(38, '#');
+        ub2 size = room;
+        EXPECT_EQ(Answer(OCIRowidToChar(row, reinterpret_cast<OraText*>(shown.data()), &size, err)), 0);
+        EXPECT_EQ(shown, Encoded("AAAAAAAAAAAAAAAAAB") + (room == 38 ? std::string(2, '\0') : "##"));
+    }
 }
 
 }  // namespace

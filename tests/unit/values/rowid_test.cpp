@@ -16,9 +16,10 @@ TEST(RowIdText, GoesBothWays) {
         rowid::RowId back{};
         EXPECT_TRUE(rowid::FromText(std::string(" ") + c.text + "  ", &back)) << c.text;
         EXPECT_EQ(back, c.value) << c.text;
-        std::uint8_t bytes[rowid::kByteLength];
+        std::uint8_t bytes[rowid::kByteLength + 1] = {};
         const bool fits = rowid::ToBytes(c.value, bytes);
         EXPECT_EQ(fits, c.value.table <= 0xFFFF);
+        EXPECT_EQ(bytes[rowid::kByteLength], 0) << "not written";
         EXPECT_TRUE(!fits || rowid::FromBytes(bytes) == c.value) << c.text;
     }
     for (const char* text : {"", "AAAAAAAAAAAAAAAAA", "AAAAAAAAAAAAAAAAAAA", "AAAAAAAAAAAAAAAAA!", "EAAAAAAAAAAAAAAAAA",
