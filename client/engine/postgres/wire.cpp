@@ -238,14 +238,15 @@ Status Wire::Lost() noexcept {
     return Refused(errors::kEndOfChannel, "the connection to the server was lost");
 }
 
+// That the connection was lost is told when the batch is drained.
 Status Wire::Pass(int commands) noexcept {
     Status first;
-    while (commands > 0 && !broken_) {
+    while (commands > 0) {
         const Result result = Next();
         if (!result) --commands;
         else if (IsError(result.get()) && first.Ok()) first = Answer(result.get());
     }
-    return broken_ && first.Ok() ? Lost() : first;
+    return first;
 }
 
 Status Wire::Drain(Result* last) noexcept {

@@ -195,13 +195,18 @@ TEST_F(Postgres, MeaningsOfTheSchema) {
         {"substr('abc', -2)", "bc"}, {"substr('abc', 0, 2)", "ab"}, {"instr('banana', 'an', 1, 2)", "4"},
         {"instr('banana', 'an', -1)", "4"}, {"rawtohex(hextoraw('0aFF'))", "0AFF"}, {"to_char(n)", ".5"},
         {"next_day(d, 'MON')", "time 2024-02-05 10:00:00"}, {"max(d)", "time 2024-01-31 10:00:00"},
-        {"to_char(d, 'YEAR')", "error 1821"}, {"nvl2(null, 1, 2)", "2"}};
+        {"to_char(d, 'YEAR')", "error 1821"}, {"nvl2(null, 1, 2)", "2"},
+        // Types that are known by their texts alone, and others beside them.
+        {"'10.1.2.3'::inet", "10.1.2.3"}, {"'{1,2}'::int[], n", "{1,2},decimal .5"},
+        {"'A0EEBC99-9C0B-4EF8-BB6D-6BB9BD380A11'::uuid, d", "a0eebc99-9c0b-4ef8-bb6d-6bb9bd380a11,time 2024-01-31 10:00:00"},
+        {"null::inet, '\\x0aff'::bytea, true, 2.5::float8, ctid", "null,bytes 2,1,real 2.5,row 00000000000000000001"}};
     for (const auto& c : cases) {
         const std::string answer = Query(std::string("select ") + c.expression + " from t");
         EXPECT_EQ(answer, answer.starts_with("error") ? c.value : std::string(c.value) + ';') << c.expression;
     }
     EXPECT_EQ(Opened("select max(d) from t")->Columns()[0].type, SQLT_DAT);
     EXPECT_EQ(Opened("select d + 1 from t")->Columns()[0].type, SQLT_DAT);
+    EXPECT_EQ(Told(Opened("select '10.1.2.3'::inet as i from t")->Columns()[0]), "I type 1 size 0 precision 0 scale 0");
 }
 
 }  // namespace
