@@ -83,7 +83,8 @@ inline std::string Shown(const Datum& value) {
             char text[date::kMaxEngineText];
             return "time " + std::string(text, date::ToEngineText(value.Timestamp(), text));
         }
-        default: return std::string(value.Text());
+        case Kind::text: return std::string(value.Text());
+        default: return "kind " + std::to_string(static_cast<int>(value.kind)) + " " + std::string(value.Text());
     }
 }
 
