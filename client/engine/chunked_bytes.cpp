@@ -52,14 +52,16 @@ void ChunkFile::GiveBack(std::span<const std::uint32_t> chunks) noexcept {
 }
 
 Status ChunkFile::Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const {
-    if (chunk >= kInMemory) return ReadTemporaryFile(file_, Place(chunk - kInMemory, at), out);
-    std::copy_n(memory_[chunk].get() + at, out.size(), out.begin());
+    const std::byte* const bytes = Memory(chunk);
+    if (!bytes) return ReadTemporaryFile(file_, Place(chunk - kInMemory, at), out);
+    std::copy_n(bytes + at, out.size(), out.begin());
     return {};
 }
 
 Status ChunkFile::Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const {
-    if (chunk >= kInMemory) return WriteTemporaryFile(file_, Place(chunk - kInMemory, at), in);
-    std::copy(in.begin(), in.end(), memory_[chunk].get() + at);    // nothing may be no place at all
+    std::byte* const bytes = Memory(chunk);
+    if (!bytes) return WriteTemporaryFile(file_, Place(chunk - kInMemory, at), in);
+    std::copy(in.begin(), in.end(), bytes + at);    // nothing may be no place at all
     return {};
 }
 
@@ -160,14 +162,39 @@ void ChunkedBytes::GiveBack(std::size_t first) noexcept {
     chunks_.resize(first);
 }
 
-Status ChunkedBytes::CopyTo(ChunkedBytes& other) const {
-    std::vector<std::byte> block(static_cast<std::size_t>(std::min<std::uint64_t>(size_, ChunkFile::kChunk)));
-    for (std::size_t read = 0; other.Size() < size_;) {
-        Status status = Read(other.Size(), block, read);
-        if (status.Ok()) status = other.Write(other.Size(), std::span(block).first(read));
+// What a chunk in memory takes is read into it.
+Status ChunkedBytes::Fill(std::uint64_t size, const Reader& read) {
+    constexpr std::size_t kChunk = ChunkFile::kChunk;
+    if (size <= kInMemory) {
+        memory_.resize(static_cast<std::size_t>(size));
+        Status status = size > 0 ? read(0, memory_) : Status();
+        if (status.Failed()) memory_.clear();
+        else size_ = size;
+        return status;
+    }
+    chunks_.reserve(static_cast<std::size_t>((size + kChunk - 1) / kChunk));
+    std::vector<std::byte> block;    // on the way to the file
+    while (size_ < size) {
+        const auto part = static_cast<std::size_t>(std::min<std::uint64_t>(size - size_, kChunk));
+        std::uint32_t chunk = 0;
+        if (Status status = file_->Take(chunk); status.Failed()) return status;
+        chunks_.push_back(chunk);
+        std::byte* const bytes = file_->Memory(chunk);
+        if (!bytes) block.resize(kChunk);
+        const std::span<std::byte> place(bytes ? bytes : block.data(), part);
+        Status status = read(size_, place);
+        if (status.Ok() && !bytes) status = file_->Write(chunk, 0, place);
         if (status.Failed()) return status;
+        size_ += part;
     }
     return {};
+}
+
+Status ChunkedBytes::CopyTo(ChunkedBytes& other) const {
+    return other.Fill(size_, [this](std::uint64_t offset, std::span<std::byte> out) {
+        std::size_t read = 0;
+        return Read(offset, out, read);
+    });
 }
 
 void ChunkedBytes::Trim(std::uint64_t size) noexcept {

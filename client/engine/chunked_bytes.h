@@ -8,6 +8,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <span>
@@ -30,6 +31,10 @@ public:
     void GiveBack(std::span<const std::uint32_t> chunks) noexcept;
     Status Read(std::uint32_t chunk, std::size_t at, std::span<std::byte> out) const;
     Status Write(std::uint32_t chunk, std::size_t at, std::span<const std::byte> in) const;
+    // A chunk's bytes; null: they lie in the file.
+    [[nodiscard]] std::byte* Memory(std::uint32_t chunk) const {
+        return chunk < kInMemory ? memory_[chunk].get() : nullptr;
+    }
     [[nodiscard]] std::size_t Used();
 
 private:
@@ -55,6 +60,9 @@ public:
     // A failure in the middle leaves what is behind the old end away.
     Status Write(std::uint64_t offset, std::span<const std::byte> in);
     void Trim(std::uint64_t size) noexcept;    // to no more than its size
+    // Where nothing is yet: so many bytes, put in place by `read`, part by part.
+    using Reader = std::function<Status(std::uint64_t offset, std::span<std::byte> out)>;
+    Status Fill(std::uint64_t size, const Reader& read);
     Status CopyTo(ChunkedBytes& other) const;    // which is empty
 
 private:

@@ -58,6 +58,7 @@ int PutLocator(const Datum& datum, Workspace& workspace, Target& target) {
     LobDescriptor* const descriptor = DescriptorAt(target.at);
     if (!descriptor) return errors::kInvalidLocator;
     if (!workspace.lobs || !workspace.lobs->store) return errors::kInconsistentTypes;
+    descriptor->Set({});    // what it held may be a copy, whose room the next one takes
     std::shared_ptr<engine::Lob> lob;
     if (const int error = TakeLob(datum, kind, workspace, lob)) return error;
     descriptor->Set({std::move(lob), workspace.lobs, national, nullptr, workspace.lobs->store});

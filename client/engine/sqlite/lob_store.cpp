@@ -32,19 +32,13 @@ std::string Quoted(std::string_view name) {
 
 Status NoValue() { return Error(errors::kNoLobValue).From("SQLITE"); }
 
-// All of an open value, in blocks.
+// All of an open value.
 Status CopyValue(SqliteConnection& connection, OpenValue& value, ChunkedBytes& bytes) {
     const bool in_transaction = connection.InTransaction();
-    std::vector<std::byte> block(static_cast<std::size_t>(std::min<std::uint64_t>(value.Length(), kBlock)));
-    for (std::uint64_t done = 0; done < value.Length();) {
-        const auto part = static_cast<std::size_t>(std::min<std::uint64_t>(value.Length() - done, block.size()));
-        const std::span read(block.data(), part);
-        const int code = value.Read(done, read);
-        if (code != SQLITE_OK) return connection.Failed(code, Verb::other, in_transaction);
-        if (Status status = bytes.Write(done, read); status.Failed()) return status;
-        done += part;
-    }
-    return {};
+    return bytes.Fill(value.Length(), [&](std::uint64_t offset, std::span<std::byte> out) {
+        const int code = value.Read(offset, out);
+        return code == SQLITE_OK ? Status() : connection.Failed(code, Verb::other, in_transaction);
+    });
 }
 
 }  // namespace
