@@ -65,11 +65,6 @@ Status ChunkFile::Write(std::uint32_t chunk, std::size_t at, std::span<const std
     return {};
 }
 
-std::size_t ChunkFile::Used() {
-    const std::lock_guard lock(mutex_);
-    return count_ - free_.size();
-}
-
 // ---- The bytes
 
 Status ChunkedBytes::Read(std::uint64_t offset, std::span<std::byte> out, std::size_t& read) const {
@@ -188,13 +183,6 @@ Status ChunkedBytes::Fill(std::uint64_t size, const Reader& read) {
         size_ += part;
     }
     return {};
-}
-
-Status ChunkedBytes::CopyTo(ChunkedBytes& other) const {
-    return other.Fill(size_, [this](std::uint64_t offset, std::span<std::byte> out) {
-        std::size_t read = 0;
-        return Read(offset, out, read);
-    });
 }
 
 void ChunkedBytes::Trim(std::uint64_t size) noexcept {

@@ -35,7 +35,6 @@ public:
     [[nodiscard]] std::byte* Memory(std::uint32_t chunk) const {
         return chunk < kInMemory ? memory_[chunk].get() : nullptr;
     }
-    [[nodiscard]] std::size_t Used();
 
 private:
     static constexpr std::uint32_t kInMemory = 512;    // the first so many chunks
@@ -63,7 +62,6 @@ public:
     // Where nothing is yet: so many bytes, put in place by `read`, part by part.
     using Reader = std::function<Status(std::uint64_t offset, std::span<std::byte> out)>;
     Status Fill(std::uint64_t size, const Reader& read);
-    Status CopyTo(ChunkedBytes& other) const;    // which is empty
 
 private:
     static constexpr std::size_t kInMemory = 4096;

@@ -99,8 +99,7 @@ private:
         const Span subject = operands_.From(at + 1);
         int depth = 1;
         for (at = subject.last; at < pieces_.size() && subject.Size() > 0; ++at) {
-            if (At(at) == "(") at = operands_.Partner(at);
-            else if (IsWord(At(at), "case")) ++depth;
+            if (IsWord(At(at), "case")) ++depth;
             else if (IsWord(At(at), "end") && --depth == 0) return;
             else if (IsWord(At(at), "when") && depth == 1) Compare(subject, operands_.From(at + 1));
         }

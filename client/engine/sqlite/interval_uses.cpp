@@ -109,12 +109,12 @@ private:
                     return IsWord(function, "count") || InList(span, open);
                 }
                 is_plain = false;
-            } else if (IsOneOf(before, {"select", "all", "distinct", "returning"}) ||
-                       (before == "," && IsOneOf(At(Clause(span.first)), {"select", "returning"}))) {
+            } else if (after != "||" && (IsOneOf(before, {"select", "all", "distinct", "returning"}) ||
+                                         (before == "," && IsOneOf(At(Clause(span.first)), {"select", "returning"})))) {
                 if (!Ends(after)) return false;
                 const std::size_t clause = Clause(span.first);
                 if (At(clause) == "(") return IsWord(before, "distinct") && IsWord(Before(clause), "count");
-                const std::size_t open = clause == kNone ? kNone : Around(clause);
+                const std::size_t open = Around(clause);
                 if (open == kNone || !IsScalar(open)) return InSelectList(span, clause, open, is_plain);
                 if (IsCompound(clause) || names_.Items(clause).size() != 1) return false;
                 span = {open, operands_.Partner(open) + 1};
@@ -132,7 +132,8 @@ private:
         if (before == "||" || after == "||")
             return (before == "||" || Begins(before)) && (after == "||" || Ends(after)) && AsText(span);
         if (IsComparison(before)) return Ends(after) && BehindComparison(span);
-        if (IsWord(before, "between")) return Ends(after) && Fits(operands_.Before(span.first - 1), span);
+        const std::size_t low = IsWord(before, "and") ? operands_.Before(span.first - 1).first : span.first;
+        if (IsWord(Before(low), "between")) return Ends(after) && Fits(Subject(low - 1), span);
         if (!Begins(before) || IsOneOf(before, {"case", "when", "then", "else", "like", "glob", "limit", "offset"})) return false;
         if (IsWord(before, "in")) return Ends(after) && Fits(Subject(span.first - 1), span);
         if (IsWord(before, "exists")) return true;
@@ -207,7 +208,7 @@ private:
         if (!IsPlainName(word)) return false;
         if (is_first && TakesText(word)) return AsText(span);
         std::size_t name = open - 1;
-        while (Before(name) == "." && name > 1) name -= 2;
+        while (Before(name) == ".") name -= 2;
         const std::size_t close = operands_.Partner(open);
         const bool names_with = IsWord(At(close + 1), "as") && !IsOneOf(At(0), {"create"});
         return IsWord(Before(name), "into") || names_with;

@@ -269,18 +269,13 @@ Status LobStore::Take(const Datum& value, bool brief, std::shared_ptr<Lob>& lob)
     return !brief && !in_transaction && !connection_.Private() ? Keep(lob) : Status();
 }
 
-// Makes it a copy of what the column holds.
+// Makes it a copy of what the column holds: rows are kept before there is any draft.
 Status LobStore::Keep(const std::shared_ptr<Lob>& lob) {
     auto& column = static_cast<ColumnLob&>(*lob);
     auto copy = std::make_unique<ChunkedBytes>(file_, std::byte{});
-    Status status;
-    if (const Draft* draft = FindDraft(*column.column_, column.row_)) {
-        status = draft->bytes.CopyTo(*copy);
-    } else {
-        status = open_.Open(connection_, column.column_, column.row_, false);
-        if (status.Ok()) status = CopyValue(connection_, open_, *copy);
-        LetGo();
-    }
+    Status status = open_.Open(connection_, column.column_, column.row_, false);
+    if (status.Ok()) status = CopyValue(connection_, open_, *copy);
+    LetGo();
     if (status.Ok()) column.copy_ = std::move(copy);
     return status;
 }

@@ -88,11 +88,20 @@ std::size_t Operands::OperandEnd(std::size_t first) const {
 std::size_t Operands::CaseEnd(std::size_t first) const {
     int depth = 0;
     for (std::size_t at = first; at < pieces_.size(); ++at) {
-        if (At(at) == "(") at = Partner(at);
         if (IsWord(At(at), "case")) ++depth;
         if (IsWord(At(at), "end") && --depth == 0) return at + 1;
     }
     return first;
+}
+
+// Where the CASE begins whose END stands before `last`.
+std::size_t Operands::CaseBegin(std::size_t last) const {
+    int depth = 0;
+    for (std::size_t at = last; at-- > 0;) {
+        if (IsWord(At(at), "end")) ++depth;
+        if (IsWord(At(at), "case") && --depth == 0) return at;
+    }
+    return last;
 }
 
 Span Operands::From(std::size_t first) const {
@@ -109,6 +118,7 @@ Span Operands::From(std::size_t first) const {
 std::size_t Operands::OperandBegin(std::size_t last) const {
     if (last == 0) return last;
     std::size_t at = last - 1;
+    if (IsWord(At(at), "end")) return CaseBegin(last);
     if (At(at) == ")") {
         at = Partner(at);
         if (at >= pieces_.size()) return last;
@@ -125,14 +135,7 @@ std::size_t Operands::OperandBegin(std::size_t last) const {
 
 Span Operands::Before(std::size_t last) const {
     std::size_t begin = OperandBegin(last);
-    while (begin < last && begin > 0 && Contains(kArithmetic, At(begin - 1))) {
-        const std::size_t earlier = OperandBegin(begin - 1);
-        if (earlier == begin - 1) {    // a sign
-            --begin;
-            break;
-        }
-        begin = earlier;
-    }
+    while (begin < last && begin > 0 && Contains(kArithmetic, At(begin - 1))) begin = OperandBegin(begin - 1);    // or a sign
     return {begin, last};
 }
 

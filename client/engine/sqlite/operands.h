@@ -40,6 +40,7 @@ public:
 private:
     [[nodiscard]] bool IsOperand(std::size_t index) const;
     [[nodiscard]] std::size_t CaseEnd(std::size_t first) const;
+    [[nodiscard]] std::size_t CaseBegin(std::size_t last) const;
     [[nodiscard]] std::size_t OperandEnd(std::size_t first) const;
     [[nodiscard]] std::size_t OperandBegin(std::size_t last) const;
 

@@ -925,6 +925,31 @@ TEST_P(LobContract, LockedOneIsWrittenAndSeenByTheNextStatement) {
     ASSERT_EQ(Answer(connection_->Commit()), 0);
     EXPECT_EQ(Stored(), "1,one;3,TH;");
     EXPECT_EQ(Write(*lob, 0, "x"), 22990);
+    const auto other = GetParam().shared ? Connect() : nullptr;
+    ASSERT_TRUE(!other || (Run(*other, "delete from l where k = 1") == 0 && other->Commit().Ok()));
+    EXPECT_EQ(Read(*lob), GetParam().shared && !GetParam().brings_lobs ? "error 22924" : "TH");
+}
+
+TEST_P(LobContract, ItsRowIsKnownHoweverTheTableIsNamed) {
+    const bool embedded = database_->GetDialect().cuts_for_update;
+    const struct { std::string sql; Effect effect; } cases[] = {
+        {embedded ? "select c from main.l where k = 3" : "select l.c from l where k = 3", Effect::locks},
+        {"select all x.c word from l as x where k = 3", Effect::locks}, {"select c as word from l x where k = 3", Effect::locks},
+        {embedded ? "insert or replace into l(rowid, k, c) values(3, 3, 'three') returning c;"
+                  : "update l set k = 3 where k = 3 returning c", Effect::changes},
+        {"update l as x set k = 3 where k = 3 returning c word", Effect::changes},
+        {std::string("update l as x set k = 3 where k = 3 returning ") + (embedded ? "l.c" : "x.c"), Effect::changes}};
+    for (const auto& c : cases) {
+        const Kept lob = Fetch(*connection_, c.sql.c_str(), c.effect);
+        ASSERT_TRUE(lob) << c.sql;
+        EXPECT_EQ(Write(*lob, 5, " more"), 0) << c.sql;
+        EXPECT_EQ(Stored(), "1,one;3,three more;") << c.sql;
+        ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    }
+    if (!embedded) return;
+    MustRun("create view w as select * from l");
+    EXPECT_EQ(Query("select c from w where k = 3"), "three;") << "whole, where its row is not known";
+    EXPECT_EQ(Query("select c isnull, k from l"), "0,1;1,2;0,3;");
 }
 
 TEST_P(LobContract, WritesGoWithTheTransactionAndItsMarks) {

@@ -81,9 +81,14 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from t where nvl(t.d, sysdate) = %", "03-FEB-24", "1;"},
         {"select id from t group by id having max(d) > %", "01-JAN-24", "1;"},
         {"select id from t group by id having % between max(d) filter (where 1 = 1) and max(d)", "03-FEB-24", "1;"},
-        {"select id from t where sysdate > % and id = 1", "01-JAN-24", "1;"},
-        {"select id from t where d > % || '-24'", "01-JAN", "1;"},
-        {"select id from t where d > case when id = 1 then % end", "01-JAN-24", "1;"},
+        {"select id from t where sysdate > % and id = 1", "31-JAN-24", "1;"},
+        {"select id from t where /**/ d /* it's ( */ = -- it's (\n %", "03-FEB-24", "1;"},
+        {"select id from (select t.* from t, u) x where d > %", "31-JAN-24", "1;"},
+        {"select id from t where n < %", "123456789012345678901234567890.5", "1;2;"},
+        {"select id from t where d > % || '-24'", "31-JAN", "1;"},
+        {"select id from t where % || '-24' < d", "31-JAN", "1;"}, {"select id from t where % || '-' || '24' = d", "03-FEB", "1;"},
+        {"select id from t where d > case when id = 1 then % end", "31-JAN-24", "1;"},
+        {"select id from t where case when 1 = 1 then case when 1 = 1 then % end end < d", "31-JAN-24", "1;"},
         {"select id from t where case d when % then 1 end = 1", "03-FEB-24", "1;"},
         {"select case when d = % then 'x' else 'y' end as s from t", "03-FEB-24", "x;y;"},
         {"select (select count(*) from t where d = %) as n from dual", "03-FEB-24", "1;"},
@@ -164,12 +169,13 @@ TEST_F(SqliteMeaning, WhatCannotBeComparedRightlyIsRefused) {
         {"select id from t where c = 'ab' = c", 933}, {"select id from t where id < 2 = 1", 933},
         {"insert into u(id) select id from t where d = '01-JAN-24' = c", 933},
         {"select id from t natural join u where d = '03-FEB-24'", 932},
+        {"select id from u natural join t where d = '03-FEB-24'", 932},
         {"create view y as select id from t where d > 'today'", 1858}};
     for (const auto& c : cases) EXPECT_EQ(Run(c.sql), c.number) << c.sql;
     for (const char* right : {"select id from t where id = 1 and (n = 5) or n = 6",
                               "select case when id = 1 then 1 else 2 end from t where id = 1",
                               "select id from t where id = case id when 1 then 1 end order by id",
-                              "select t.id from t join u on t.id = u.id where t.id = 1",
+                              "select t.id from t join u on t.id = u.id where t.id = 1", "select id from t where id = 1 order by n = 5, n = 6",
                               "select id from t where id = 1 group by id having count(*) = 1"})
         EXPECT_EQ(Rows(right), "1;") << right;
 }

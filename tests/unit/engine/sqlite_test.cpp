@@ -1,10 +1,12 @@
 // What is the SQLite engine's own: numbers and declared types in a file, descriptions, SQL functions, errors by number,
 // the accounts' table, files that cannot be written, databases in memory.
 #include <sqlite3.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <fstream>
 #include <functional>
 #include <thread>
@@ -24,6 +26,7 @@ TEST_F(Sqlite, NumbersKeepEveryDigit) {
         {"0", "0"}, {"-1", "-1"}, {"123.45", "real 123.45"}, {"9223372036854775807", "9223372036854775807"},
         {"-9223372036854775808", "-9223372036854775808"}, {"9223372036854775808", "decimal 9223372036854775808"},
         {"123456789012345.5", "decimal 123456789012345.5"}, {"12345678901234.5", "real 12345678901234.5"},
+        {"-12345678901234.5", "real -12345678901234.5"}, {"-1234567890123.45", "real -1234567890123.45"},
         {"-1234567890123456789012345678901234567.8", "decimal -1234567890123456789012345678901234567.8"},
         {"100000000000000000000", "real 1e+20"}};
     for (const auto& c : cases) {
@@ -48,7 +51,7 @@ TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
 // The same value through a placeholder, as a literal, from a query and by an update.
 TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
     MustRun("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
-            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18))");
+            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18), z number(2,3), u varchar2(40))");
     const struct { const char* column; const char* literal; const char* outcome; } cases[] = {
         {"n", "'12.345'", "real 12.35"}, {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"},
         {"n", "-1000", "error 1438"}, {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"},
@@ -64,7 +67,9 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
         {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 2"},
         {"x", "'1.23456789012345678'", "decimal 1.234567890123457"}, {"b", "'any text at all'", "any text at all"},
         {"e", "-999999999999999999", "-999999999999999999"}, {"e", "1000000000000000000", "error 1438"},
-        {"n", "null", "null"}};
+        {"n", "null", "null"}, {"n", "1e3", "error 1438"}, {"z", "0", "0"}, {"z", "1", "error 1438"}, {"z", "0.012", "real 0.012"},
+        {"z", "0.12", "error 1438"}, {"r", "'0:'", "error 1465"}, {"r", "5", "error 932"}, {"d", "''", "null"},
+        {"u", "kelp_number('123456789012345678901234567890.5')", "123456789012345678901234567890.5"}};
     for (const auto& c : cases) {
         const std::string column = c.column;
         const std::string literal = c.literal;
@@ -137,7 +142,7 @@ TEST_F(Sqlite, ColumnsAreDescribed) {
     ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR (5), d timestamp_tz(3), "
                   "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5))"), 0);
     const auto query = Prepared("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
-                               "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', count(kelp_date(b )) from t");
+                               "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', kelp_varchar(ifnull(b, 'x'), 9), count(kelp_date(b )) from t");
     struct Expected { const char* name; std::uint16_t type; std::uint32_t size; int precision, scale; bool nullable; };
     const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false}, {"Mixed", SQLT_CHR, 20, 0, 0, true}, {"C", SQLT_AFC, 5, 0, 0, true},
                                  {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true}, {"E", SQLT_NUM, 22, 0, -127, true},
@@ -146,6 +151,7 @@ TEST_F(Sqlite, ColumnsAreDescribed) {
                                  {"I", SQLT_NUM, 22, 5, 0, true}, {"1+1", SQLT_NUM, 22, 0, -127, true},
                                  {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true}, {"ROWID", SQLT_RDD, 18, 0, 0, false},
                                  {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
+                                 {"CAST(IFNULL(B, 'x') AS VARCHAR2(9))", SQLT_CHR, 9, 0, 0, true},
                                  {"COUNT(CAST(B AS DATE))", SQLT_NUM, 22, 0, -127, true}};
     const auto& columns = query->Columns();
     ASSERT_EQ(columns.size(), std::size(expected));
@@ -165,7 +171,7 @@ TEST_F(Sqlite, CastsKeepDigitsAndDates) {
         {"select kelp_date('2024-02-29 13:14:15.5 +01:00'), substr(?1, 1, 0)", "time 2024-02-29 13:14:15,null;"},
         {"values(kelp_number(?1, 2, 2))", "error 1438"}, {"select kelp_number('x' || ?1)", "error 1722"},
         {"select kelp_varchar('äöü' || ifnull(substr(?1, 1, 0), ''), 2), kelp_char('a', 3)", "ä,a  ;"},
-        {"select kelp_date('2024-02-30'), ?1", "error 1839"},
+        {"select kelp_date('2024-02-30'), ?1", "error 1839"}, {"select kelp_char('abc'), kelp_varchar('abc'), ?1 > 0", "a,abc,1;"},
         {"select kelp_date('2024-02-29T13:14:15.5'), substr(?1, 1, 0)", "time 2024-02-29 13:14:15,null;"}};
     for (const auto& c : cases) EXPECT_EQ(Query(c.sql, {Decimal(pi)}), c.rows) << c.sql;
 }
@@ -181,7 +187,8 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
          "time 2024-02-09 00:00:00,time 2024-02-09 00:00:00;"},
         {"to_date('2024-13-01', 'YYYY-MM-DD')", "error 1843"}, {"to_date('x', 'YYYY')", "error 1858"},
         {"to_timestamp('090224 5', 'DDMMRR FF')", "time 2024-02-09 00:00:00.5;"},
-        {"to_date('2024 5', 'YYYY FF')", "error 1821"},
+        {"to_date('2024 5', 'YYYY FF')", "error 1821"}, {"to_date('2024-02-30')", "error 1839"}, {"to_date('x')", "error 1858"},
+        {"to_date('2024-02-09 01:02:03.5'), trunc('9-feb-24', 'mm')", "time 2024-02-09 01:02:03,2024-02-01 00:00:00;"},
         {"to_number('-1.50'), to_number('1,234', '9,999'), to_number(null)", "real -1.5,1234,null;"},
         {"to_number('1x')", "error 1722"}, {"to_number('1x', '99')", "error 1722"},
         {"add_months('2024-01-31 10:00:00', 1), add_months('2024-02-29', -12)",
@@ -192,7 +199,8 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
          " months_between('0001-01-05', '-0001-01-05')", "1,decimal -1.51612903225806451612903225806451612903,12;"},
         {"last_day('2024-02-01 01:02:03'), next_day('2024-02-09', 'friday'), next_day('2024-02-09', 1)",
          "time 2024-02-29 01:02:03,time 2024-02-16 00:00:00,time 2024-02-11 00:00:00;"},
-        {"next_day('2024-02-09', 'nonday')", "error 1846"}, {"next_day('10:00:00', 'friday')", "error 932"},
+        {"next_day('2024-02-09', 'nonday')", "error 1846"}, {"next_day('2024-02-09', 8)", "error 1846"},
+        {"next_day('10:00:00', 'friday')", "error 932"},
         {"trunc(2.79), trunc(-2.79, 1), trunc(1279, -2), trunc('5.5')", "2,real -2.7,1200,5;"},
         {"trunc('2024-02-09 13:14:15'), trunc(to_date('09-02-24', 'DD-MM-YY'), 'yyyy')",
          "2024-02-09 00:00:00,time 2024-01-01 00:00:00;"},
@@ -200,8 +208,11 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
          " trunc('2024-08-15', 'ww'), trunc('2024-08-15', 'w'), trunc('2000-08-15', 'cc')",
          "2024-07-01 00:00:00,2024-08-12 00:00:00,2024-08-11 00:00:00,2024-08-12 00:00:00,2024-08-15 00:00:00,"
          "1901-01-01 00:00:00;"},
-        {"trunc('2024-08-15', 'xx')", "error 1898"},
-        {"hextoraw('abc'), rawtohex(x'0aff'), rawtohex('A')", "bytes 2,0AFF,41;"}, {"hextoraw('0g')", "error 1465"},
+        {"trunc('2024-08-15 13:14:15', 'hh'), trunc('2024-08-15 13:14:15', 'mi'), trunc('-0150-08-15', 'cc'), trunc('-0100-08-15', 'cc')",
+         "2024-08-15 13:00:00,2024-08-15 13:14:00,-0200-01-01 00:00:00,-0100-01-01 00:00:00;"},
+        {"trunc('2024-08-15', 'xx')", "error 1898"}, {"trunc(x'01')", "error 1722"},
+        {"hextoraw('abc'), hextoraw('a'), rawtohex(x'0aff'), rawtohex('A'), length(empty_clob()), length(empty_blob())",
+         "bytes 2,bytes 1,0AFF,41,0,0;"}, {"hextoraw('0g')", "error 1465"},
         {"rawtohex(5)", "error 932"}, {"lpad('x', 1e19)", "error 1426"},
         {"months_between('2024-03-10 12:00:00', '2024-02-09')", "decimal 1.0483870967741935483870967741935483871;"},
         {"decode(2, 1, 'a', 2, 'b'), decode(null, 1, 'a', null, 'n'), decode(3, 1, 'a'), decode(3, 1, 'a', 'else'),"
@@ -281,15 +292,15 @@ TEST_F(Sqlite, FilesInUtf16AreReadAsAnyOther) {
 }
 
 TEST_F(Sqlite, TextThatIsNoDateStaysAText) {
-    ASSERT_EQ(Run("create table t(d date, s timestamp with time zone)"), 0);
+    ASSERT_EQ(Run("create table t(d date, s timestamp with time zone, i span_ds(1,0))"), 0);
     connection_.reset();
     sqlite3* file = nullptr;
     ASSERT_EQ(sqlite3_open((folder_ + "/test.db").c_str(), &file), SQLITE_OK);
-    ASSERT_EQ(sqlite3_exec(file, "insert into t values('soon', '12:30:00'), (5, '2024-02-29 01:02:03.5 +01:00')", nullptr,
+    ASSERT_EQ(sqlite3_exec(file, "insert into t values('soon', '12:30:00', 'long'), (5, '2024-02-29 01:02:03.5 +01:00', 1728000500000000)", nullptr,
                            nullptr, nullptr), SQLITE_OK);
     sqlite3_close(file);
     connection_ = Connect();
-    EXPECT_EQ(Query("select d, s from t"), "soon,12:30:00;5,time 2024-02-29 01:02:03.5 +01:00;");
+    EXPECT_EQ(Query("select d, s, i from t"), "soon,12:30:00,long;5,time 2024-02-29 01:02:03.5 +01:00,+000000020 00:00:00.500000000;");
 }
 
 TEST_F(Sqlite, BoundMomentsAreWrittenAsTheirColumnsAre) {
@@ -397,8 +408,12 @@ TEST_F(Sqlite, SchemasAndTheDatabaseAreDescribed) {
     engine::ObjectDescription object;
     ASSERT_EQ(Answer(connection_->Describe("t", engine::ObjectKind::any, object)), 0);
     EXPECT_EQ(object.schema, "TEMP") << "as SQLite looks for a name";
+    EXPECT_TRUE(object.temporary);
     ASSERT_EQ(Answer(connection_->Describe("main.t", engine::ObjectKind::any, object)), 0);
     EXPECT_EQ(object.columns[0].name, "N");
+    EXPECT_FALSE(object.temporary);
+    MustRun("create table \"o`d\"(n integer)");
+    EXPECT_EQ(Answer(connection_->Describe("\"o`d\"", engine::ObjectKind::table, object)), 0);
     ASSERT_EQ(Answer(connection_->Describe("TEST", engine::ObjectKind::database, object)), 0);
     EXPECT_EQ(object.members, (std::vector<std::string>{"TEMP", "MAIN"}));
 }
@@ -415,6 +430,18 @@ TEST_F(Sqlite, BrokenDatabasesHaveTheirNumbers) {
 
     EXPECT_EQ(Query("pragma max_page_count = 10"), "10;");
     EXPECT_EQ(Run("insert into t values(2, zeroblob(100000))"), 1653) << "full";
+    EXPECT_EQ(Query("select n, v from t"), "1,kept;");
+
+    rlimit limit{};
+    getrlimit(RLIMIT_FSIZE, &limit);
+    const auto may_grow_to = [&](rlim_t size) { setrlimit(RLIMIT_FSIZE, (limit.rlim_cur = size, &limit)); };
+    const auto handler = std::signal(SIGXFSZ, SIG_IGN);
+    EXPECT_EQ(Query("pragma max_page_count = 10000"), "10000;");
+    ASSERT_EQ(Run("insert into t values(2, zeroblob(100000))"), 0);
+    may_grow_to(50000);
+    EXPECT_EQ(Answer(connection_->Commit()), 1653) << "the limit of the process";
+    may_grow_to(limit.rlim_max);
+    std::signal(SIGXFSZ, handler);
     EXPECT_EQ(Query("select n, v from t"), "1,kept;");
 
     EXPECT_EQ(Query("pragma query_only = 1"), "");
@@ -438,7 +465,8 @@ TEST_F(Sqlite, FileThatCannotBeWrittenIsRead) {
     MustCommit("create table t(n integer)", "insert into t values(1)");
     connection_.reset();
     database_.reset();
-    const std::string file = folder_ + "/test.db";
+    const std::string file = folder_ + "/a %25?\xC3\xA4.db";
+    fs::rename(folder_ + "/test.db", file);
     ASSERT_FALSE(fs::exists(file + "-wal"));
     const auto look = [&] {
         std::unique_ptr<engine::Database> database;
