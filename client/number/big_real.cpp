@@ -246,10 +246,6 @@ BigReal BigReal::Nearest(unsigned* quarter) const {
     BigReal result(count_);
     if (zero_ || exponent_ < 0) return result;
     const long behind = kLimbBits * count_ - exponent_;  // bits behind the point
-    if (behind <= 0) {
-        if (behind == 0) *quarter = limbs_[0] & 3;
-        return *this;
-    }
     // Half is added at the first bit behind the point, then those bits are cleared.
     mp_limb_t limbs[kMaxLimbs + 1];
     const auto place = static_cast<unsigned>(behind - 1);

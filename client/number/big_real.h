@@ -45,7 +45,7 @@ public:
     [[nodiscard]] BigReal Negated() const { return WithSign(!negative_); }
     [[nodiscard]] BigReal Magnitude() const { return WithSign(false); }
     [[nodiscard]] BigReal SquareRoot() const;  // of a value that is not negative
-    // The nearest whole number, and its remainder by 4 (0 to 3).
+    // The nearest whole number, and its remainder by 4 (0 to 3). Of a value that has bits behind the point.
     [[nodiscard]] BigReal Nearest(unsigned* quarter) const;
 
     // The bits behind the point of a value from 0 to below 1, in `Count()` limbs; and back.

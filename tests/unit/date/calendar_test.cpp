@@ -108,6 +108,8 @@ TEST(Calendar, ResultsOutOfRange) {
     EXPECT_EQ(AddMonths(Day(2024, 1, 1), INT32_MIN, &result), 1841);
     EXPECT_EQ(NextDay(Day(9999, 12, 31), 0, &result), 1841);
     EXPECT_EQ(result, Day(1999, 9, 9));
+    EXPECT_EQ(AddDays(Day(-4712, 1, 2), -1, &result), 0);
+    EXPECT_EQ(result, Day(-4712, 1, 1));
 }
 
 TEST(Calendar, RoundsTheFractionAndCarries) {
@@ -177,6 +179,7 @@ TEST(DateForms, EngineTextIsReadInAllItsShapes) {
 TEST(DateForms, EngineTextThatIsRefused) {
     const struct { const char* text; Errno number; } cases[] = {
         {"", 1861}, {"-", 1861}, {"2024", 1861}, {"2024-", 1861}, {"2024-02", 1861}, {"2024-02-29x", 1861},
+        {"2024-02-1:", 1861}, {"2024-02-0:", 1861},
         {"2024-02-29 ", 1861}, {"2024-02-29 12", 1861}, {"2024-02-29 12:00:00.", 1861}, {"2024-02-29 12:00:00 +", 1861},
         {"2024-02-29 12:00:00 +1:", 1861}, {"2024-02-29 12:00:00 +16:00", 1861}, {"2024-02-29 12:00:00 +05:30x", 1861},
         {"-12:00", 1861}, {"100:00", 1861}, {"12345678-01-01", 1841}, {"10000-01-01", 1841}, {"0000-01-01", 1841},

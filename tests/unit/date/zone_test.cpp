@@ -136,7 +136,7 @@ TEST(ZoneRules, AgreeWithTheCLibrary) {
 
 TEST(ZoneRules, TextsOfRules) {
     const struct { const char* text; std::int64_t moment; int offset; const char* name; } cases[] = {
-        {"UTC0", 0, 0, "UTC"}, {"<+0330>-3:30", 0, 12600, "+0330"},
+        {"UTC0", 0, 0, "UTC"}, {"LMT-0:20:59", 0, 1259, "LMT"}, {"<+0330>-3:30", 0, 12600, "+0330"},
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846799, 3600, "CET"},
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"}, {"EST5EDT", 1720000000, -14400, "EDT"},
         {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
@@ -152,7 +152,7 @@ TEST(ZoneRules, TextsOfRules) {
         EXPECT_EQ(rules->At(c.moment).abbreviation, c.name) << c.text;
     }
     for (const char* text : {"", "UTC", "5", "CET-1CEST,", "CET-1CEST,M3.5.0", "CET-1CEST,M13.5.0,M10.5.0",
-                             "CET-1CEST,M3.6.0,M10.5.0", "<CET-1", "CET-999", "UTC0x"}) {
+                             "CET-1CEST,M3.6.0,M10.5.0", "<CET-1", "CET-999", "UTC0x", "LMT0:60", "LMT0:0:60", "LMT0:0:"}) {
         EXPECT_FALSE(ZoneRules::FromText(text)) << text;
     }
 }

@@ -1,6 +1,8 @@
 // Arithmetic on numbers, against exact fractions.
 #include <gtest/gtest.h>
 
+#include <cmath>
+
 #include "number/add_wide.h"
 #include "reference.h"
 
@@ -199,6 +201,10 @@ TEST(NumberArithmetic, BytesThatAreNoNumber) {
         EXPECT_EQ(number::Sub(Number("1"), value, &got), 22060);
         EXPECT_EQ(number::Sin(value, &got), 22060);
         EXPECT_EQ(number::Compare(value, value, &tested), 22060);
+        EXPECT_EQ(number::Sign(value, &tested), 22060);
+        EXPECT_EQ(number::IsZero(value, &tested), 22060);
+        double real = 0;
+        EXPECT_EQ(number::ToDouble(value, &real), 22060);
     }
 }
 
@@ -237,6 +243,21 @@ TEST(NumberArithmetic, InfinitiesCompareButDoNotCompute) {
     OCINumber got;
     ASSERT_EQ(number::Neg(plus, &got), 0);
     EXPECT_EQ(got, minus);
+    ASSERT_EQ(number::Neg(minus, &got), 0);
+    EXPECT_EQ(got, plus);
+    const struct { OCINumber value; int sign; const char* text; number::Errno integer; } cases[] = {{plus, 1, "~", 22053}, {minus, -1, "-~", 22054}};
+    for (const auto& c : cases) {
+        int sign = 0, whole = 1, zero = 1;
+        double real = 0;
+        std::uint64_t bits = 0;
+        got = Number("7");
+        EXPECT_EQ(number::Abs(c.value, &got) + number::Sign(c.value, &sign) + number::IsInt(c.value, &whole) +
+                      number::IsZero(c.value, &zero) + number::ToDouble(c.value, &real), 0);
+        EXPECT_EQ(got, plus) << c.text;
+        EXPECT_TRUE(sign == c.sign && whole == 0 && zero == 0 && real == c.sign * HUGE_VAL) << c.text;
+        EXPECT_EQ(Shown(c.value), c.text);
+        EXPECT_EQ(number::ToInteger(c.value, 8, true, &bits), c.integer);
+    }
     EXPECT_EQ(number::Add(plus, minus, &got), 22053);
     EXPECT_EQ(number::Cos(plus, &got), 22053);
 }

@@ -44,7 +44,7 @@ TEST(NumberToText, EveryElement) {
         {"12", "999PR", "  12 "}, {"-5", "FM999PR", "<5>"}, {"123.456", "9.9EEEE", " 1.2E+02"},
         {"1E123", "9.9EEEE", " 1.0E+123"}, {"-0.00996", "9.9EEEE", "-1.0E-02"}, {"0", "9.9EEEE", " 0.0E+00"},
         {"12.345", "99V99", " 1235"}, {"0.04", "9V99", "   4"}, {"0.04", "9V09", "  04"}, {"0.5", "TM", ".5"},
-        {"-123.40", "TM9", "-123.4"}, {"123", "TME", "1.23E+02"},
+        {"-123.40", "TM9", "-123.4"}, {"123", "TME", "1.23E+02"}, {"0", "TME", "0E+00"},
         {"1E63", "TM9", "1000000000000000000000000000000000000000000000000000000000000000"}, {"-1E63", "TM9", "-1E+63"},
         {"1E-63", "TM", ".000000000000000000000000000000000000000000000000000000000000001"}, {"-1E-63", "TM", "-1E-63"},
         {"0", "TM", "0"}, {"255", "XXXX", "   FF"}, {"255.5", "xxx", " 100"}, {"255", "0XXX", " 00FF"},
@@ -63,7 +63,7 @@ TEST(NumberToText, EveryElement) {
         // A negative value stays one when its digits become 0.
         {"-0.001", "9.99", " -.00"}, {"-0.001", "9.99S", " .00-"}, {"-0.001", "9.99PR", " <.00>"},
         {"5", "FM999PR", "5"}, {"255", "xX", " ff"}, {"4", "FMrN", "iv"}, {"3999", "FMRN", "MMMCMXCIX"},
-        {"1.5", "FM9.90", "1.50"}, {"1.5", "FM9.99EEEE", "1.5E+00"}, {"1.5", "FM9.90EEEE", "1.50E+00"},
+        {"1.5", "FM9.90", "1.50"}, {"1.5", "FM9.99EEEE", "1.5E+00"}, {"120", "FM9.99EEEE", "1.2E+02"}, {"1.5", "FM9.90EEEE", "1.50E+00"},
         {"1E100", "9.9EEEE", " 1.0E+100"}, {"1E-100", "9.9EEEE", " 1.0E-100"}, {"0.6", "9", " 1"}, {"0.04", "FM9.9", "0."},
         {"-0.4", "99MI", " 0-"},     {"-0.001", "B9.99", "     "},
     };
@@ -98,6 +98,7 @@ TEST(NumberToText, SettingsOfTheNlsText) {
     EXPECT_EQ(Formatted("1234", "9,999", kGerman), " 1,234") << "as it is written";
     EXPECT_EQ(Formatted("12", "L999", kGerman), "  \xE2\x82\xAC" "12");
     EXPECT_EQ(Formatted("12.5", "99L99", kGerman), " 12\xE2\x82\xAC" "50");
+    EXPECT_EQ(Formatted("123", "L99", "NLS_CURRENCY=''\xC2\xA3''"), "####");
     EXPECT_EQ(Formatted("12", "C99U", kGerman), "22061");
     EXPECT_EQ(Formatted("12", "99U", kGerman), " 12DM");
     EXPECT_EQ(Formatted("12", "FM99C", kGerman), "12EUR");
@@ -106,7 +107,8 @@ TEST(NumberToText, SettingsOfTheNlsText) {
     for (const char* nls :
          {"x", "NLS_CURRENCY", "NLS_CURRENCY=''a", "NLS_CURRENCY=''12345678901''", "NLS_DATE_LANGUAGE=x",
           "NLS_NUMERIC_CHARACTERS=''..''", "NLS_NUMERIC_CHARACTERS=''.''", "NLS_NUMERIC_CHARACTERS=''.-''",
-          "NLS_NUMERIC_CHARACTERS=''1,''", "NLS_ISO_CURRENCY=ATLANTIS", "= ''a''"})
+          "NLS_NUMERIC_CHARACTERS=''1,''", "NLS_ISO_CURRENCY=ATLANTIS", "= ''a''",
+          "NLS_NUMERIC_CHARACTERS=''\xC3\xA4''"})
         EXPECT_EQ(Formatted("1", "9", nls), "22064") << nls;
 }
 
@@ -118,6 +120,7 @@ TEST(NumberFromText, EveryElement) {
         {"+12", "S99", "12"},     {"12-", "99S", "-12"},   {"1.2E+02", "9.9EEEE", "120"}, {"1234", "99V99", "12.34"},
         {"FF", "XX", "255"},      {"ff", "XXX", "255"},    {"MCMXCIX", "RN", "1999"},     {"iv", "rn", "4"},
         {"1.5e3", "TM9", "1500"}, {".5", "9.9", ".5"},     {"5", "0999", "5"},            {"-1.25e-2", "", "-.0125"},
+        {"12", "99.9", "12"},     {"  ", "B99", "0"},      {"12", "99L99", "12"},
         // A model of nines as long as the literal takes any literal.
         {"0.0", "999", "0"}, {"-12.5", "99999", "-12.5"}, {"1e5", "999", "100000"},
     };
@@ -137,7 +140,7 @@ TEST(NumberFromText, TextsThatDoNotFit) {
         {"1 2", "9999", "22062"}, {"<12", "99PR", "22062"}, {"12>", "99PR", "22062"}, {"FG", "XX", "22062"},
         {"FFF", "XX", "22062"},   {"IIII", "RN", "22062"},  {"CMD", "RN", "22062"},   {"XCX", "RN", "22062"},
         {"-", "99", "22062"},     {"12x", "99", "22062"},   {"1,23", "9,999", "22062"}, {"   ", "XX", "22062"},
-        {"MMMM", "RN", "22062"},
+        {"MMMM", "RN", "22062"},   {"  ", "RN", "22062"},     {"", "B99", "22062"},
         {"--1", "999", "22062"},  {"1e200", "", "22053"},   {"1e-200", "", "22054"},  {"1", "9Z", "22061"}};
     for (const auto& c : cases)
         EXPECT_EQ(Parsed(c.text, c.model), std::string("error ") + c.error) << c.text << " by " << c.model;

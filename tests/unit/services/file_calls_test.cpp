@@ -68,6 +68,7 @@ TEST_F(FileCalls, CreateFlagsAndModes) {
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_CREATE, 0, "+ld"},
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_EXCL, 30151, "old"},
         {"there", OCI_FILE_READ_WRITE, OCI_FILE_TRUNCATE, 0, "+"},
+        {"there", OCI_FILE_READ_ONLY, OCI_FILE_TRUNCATE, 0, ""},
         {"there", OCI_FILE_WRITE_ONLY, OCI_FILE_APPEND, 0, "old+"},
         {"there", OCI_FILE_READ_WRITE, OCI_FILE_APPEND, 0, "old+"}, {"there", 0, OCI_FILE_CREATE, 30150, "old"},
         {"there", 4, OCI_FILE_CREATE, 30150, "old"}, {"there", static_cast<ub4>(-128), OCI_FILE_CREATE, 30150, "old"},
@@ -87,12 +88,14 @@ TEST_F(FileCalls, CreateFlagsAndModes) {
         ASSERT_EQ(Open(c.name, c.mode, c.create, &file), c.answer) << c.name << ' ' << c.mode << ' ' << c.create;
         EXPECT_EQ(file != nullptr, c.answer == 0);
         if (file) {
-            EXPECT_EQ(Write(file, "+"), 0);
+            EXPECT_EQ(Write(file, "+"), c.mode == OCI_FILE_READ_ONLY ? 30157 : 0);
             EXPECT_EQ(Answer(OCIFileClose(env_, err_, file)), 0);
         }
         EXPECT_EQ(FileContents(c.name), c.after) << c.name << ' ' << c.mode << ' ' << c.create;
         EXPECT_EQ(descriptors(), before) << c.name << ' ' << c.mode << ' ' << c.create;
     }
+    EXPECT_EQ(access((folder_ + "/made2").c_str(), R_OK | W_OK), 0);
+    EXPECT_NE(access((folder_ + "/made2").c_str(), X_OK), 0);
 }
 
 TEST_F(FileCalls, ErrorsCarryTheSystemsWords) {
@@ -177,15 +180,16 @@ TEST_F(FileCalls, ExistenceAndLength) {
 }
 
 TEST_F(FileCalls, StandardFilesStayOpen) {
-    OCIFileObject *out = nullptr, *in = nullptr;
+    OCIFileObject *out = nullptr, *in = nullptr, *err = nullptr, *null = nullptr;
     ASSERT_EQ(Answer(OCIFileOpen(env_, err_, &out, nullptr, nullptr, 0, 0, OCI_FILE_STDOUT)), 0);
     ASSERT_EQ(Answer(OCIFileOpen(env_, err_, &in, nullptr, nullptr, 0, 0, OCI_FILE_STDIN)), 0);
+    ASSERT_EQ(Answer(OCIFileOpen(env_, err_, &err, nullptr, nullptr, 0, 0, OCI_FILE_STDERR)), 0);
+    ASSERT_EQ(Answer(OCIFileOpen(env_, err_, &null, Text("null"), Text("/dev"), OCI_FILE_WRITE_ONLY, OCI_FILE_TRUNCATE,
+                                 OCI_FILE_BIN)), 0) << "which holds nothing";
     EXPECT_EQ(Read(out, 1), "30157");
     EXPECT_EQ(Write(in, "x"), 30157);
-    EXPECT_EQ(Answer(OCIFileClose(env_, err_, out)), 0);
-    EXPECT_EQ(Answer(OCIFileClose(env_, err_, in)), 0);
-    EXPECT_NE(fcntl(STDOUT_FILENO, F_GETFD), -1);
-    EXPECT_NE(fcntl(STDIN_FILENO, F_GETFD), -1);
+    for (OCIFileObject* file : {out, in, err, null}) EXPECT_EQ(Answer(OCIFileClose(env_, err_, file)), 0);
+    for (const int standard : {0, 1, 2}) EXPECT_NE(fcntl(standard, F_GETFD), -1) << standard;
 }
 
 TEST_F(FileCalls, NamesInUtf16) {
