@@ -102,6 +102,7 @@ private:
     Status Keep(std::uint64_t rows);
     Status KeepRow();
     Status GiveTo(RowSink& sink);
+    void CopyRow();
     void Hold();
     Status Fill(const PGresult* result, int row);
     Status FillLobs(const PGresult* result, int row);
@@ -132,6 +133,8 @@ private:
         std::vector<Datum> values;
         std::vector<ValueRoom> rooms;
         std::vector<std::string> lobs;
+        std::vector<std::string> copies;    // of rows of the store
+        Result result;                      // of a row that is held
     } at_hand_;
     bool delivers_ = false;                // the sink has the row at hand
     RowAtHand held_;                       // or this one, where the sink itself has the rest read ahead

@@ -141,6 +141,7 @@ Status PgQuery::GiveTo(RowSink& sink) {
     } const delivery{*this};
     delivers_ = true;
     try {
+        if (scrollable_ && state_ == State::coming && !lobs_.empty()) CopyRow();
         return sink.Row(0, at_hand_.values);
     } catch (const std::bad_alloc&) {
         if (came && state_ == State::coming) state_ = State::on_row;
@@ -149,7 +150,18 @@ Status PgQuery::GiveTo(RowSink& sink) {
     }
 }
 
-// The row that the sink has keeps its values, as copies; the next ones get another place.
+// The store may move what it has when more comes.
+void PgQuery::CopyRow() {
+    at_hand_.copies.resize(at_hand_.values.size());
+    for (std::size_t index = 0; index < at_hand_.copies.size(); ++index) {
+        Datum& value = at_hand_.values[index];
+        if (value.length == 0) continue;
+        at_hand_.copies[index] = value.Text();
+        value.data = at_hand_.copies[index].data();
+    }
+}
+
+// The row that the sink has stays where it is; the next ones get another place.
 void PgQuery::Hold() {
     if (!scrollable_) {
         if (Status status = store_.Add(at_hand_.values); status.Failed()) throw std::bad_alloc();
@@ -159,16 +171,8 @@ void PgQuery::Hold() {
     other.values.resize(at_hand_.values.size());
     other.rooms.resize(at_hand_.rooms.size());
     other.lobs.resize(at_hand_.lobs.size());
-    std::vector<std::string> copies(at_hand_.values.size());
-    for (std::size_t index = 0; index < copies.size(); ++index) {
-        const Datum& value = at_hand_.values[index];
-        if (value.length > 0) copies[index] = value.Text();
-    }
     held_ = std::exchange(at_hand_, std::move(other));
-    held_.lobs = std::move(copies);
-    for (std::size_t index = 0; index < held_.lobs.size(); ++index) {
-        if (held_.values[index].length > 0) held_.values[index].data = held_.lobs[index].data();
-    }
+    held_.result = std::move(row_);
     delivers_ = false;
 }
 
@@ -208,7 +212,7 @@ void PgQuery::ReadAhead() noexcept {
 void PgQuery::Leave() noexcept {
     Wire& server = connection_.Server();
     const Wire::Heeding undisturbed(server, false);
-    row_.reset();
+    if (!delivers_) row_.reset();
     bool more = true;
     for (int row = 0; more && (row < kRowsBeforeCancel || effect_ != Effect::reads); ++row) more = server.Next() != nullptr;
     if (more) server.Cancel();
@@ -231,7 +235,7 @@ Status PgQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
     status = store_.Read(position - 1, at_hand_.values);
     if (!status.Ok()) return Ended(std::move(status));
     found = true;
-    return sink.Row(0, at_hand_.values);
+    return GiveTo(sink);
 }
 
 Status PgQuery::Count(std::uint64_t& rows) {
