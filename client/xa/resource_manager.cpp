@@ -76,7 +76,7 @@ Status ResourceManager::LogOff() {
     ServiceContext* const service = GetService();
     if (!service) return {};
     service->TakeBack();
-    return service->LogOff();
+    return service->GetSession() ? service->LogOff() : Status();    // the application has logged it off itself
 }
 
 ManagerPointer FindManager(int rmid) {

@@ -246,6 +246,18 @@ TEST_F(LegacyCalls, RowsThatCannotBeStoredArePassedOver) {
     EXPECT_EQ(std::make_tuple(cda.wrn, code, indicator), std::make_tuple(0, 1405, -1));
 }
 
+TEST_F(LegacyCalls, PackedDecimalsHaveAScale) {
+    std::array<ub1, 3> packed{};
+    ASSERT_EQ(Parse("select :v from dual"), 0);
+    ASSERT_EQ(obndrv(&cda, T("v"), -1, packed.data(), 3, SQLT_PDN, 2, nullptr, nullptr, -1, -1), 0);
+    for (const auto& [scale, digits] : {std::pair{2, 0x98765D}, {1, 0x09877D}, {0, 0x00988D}, {-1, 0x00988D}}) {
+        packed = {0x98, 0x76, 0x5D};    // -987.65
+        EXPECT_EQ(odefin(&cda, 1, packed.data(), 3, SQLT_PDN, scale, nullptr, nullptr, -1, -1, nullptr, nullptr), 0);
+        EXPECT_EQ(oexfet(&cda, 1, 0, 0), 0);
+        EXPECT_EQ(packed[0] << 16 | packed[1] << 8 | packed[2], digits) << scale;
+    }
+}
+
 TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
     ASSERT_EQ(Parse("insert into t values (:1, :text)"), 0);
     EXPECT_EQ(oexec(&cda), 1008);
@@ -253,7 +265,7 @@ TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
     for (const sword position : {0, 2}) {
         EXPECT_EQ(obndrn(&cda, position, host.data(), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1), 1036);
     }
-    for (const sword type : {SQLT_CLOB, SQLT_CUR, SQLT_RDD, SQLT_VST, 91, 70000, -1}) {
+    for (const sword type : {SQLT_CLOB, SQLT_CUR, SQLT_RDD, SQLT_VST, 91, 65536 + SQLT_CHR, -1}) {
         EXPECT_EQ(Bind(":text", characters.data(), 8, type), 1024) << type;
     }
     for (const sword type : {SQLT_INT, SQLT_FLT, SQLT_CHR, SQLT_BFLOAT}) {
@@ -262,6 +274,7 @@ TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
     for (const sword type : {SQLT_STR, SQLT_NUM, SQLT_VNU, SQLT_DAT, SQLT_ODT}) {
         EXPECT_EQ(Bind(":text", host.data(), -1, type), 0) << type;
     }
+    EXPECT_EQ(Bind(":text", nullptr, -1, SQLT_STR), 1025);
     EXPECT_EQ(obndrv(&cda, nullptr, 0, host.data(), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1), 1009);
     EXPECT_EQ(oexn(&cda, 2, 2), 24333);
     ASSERT_EQ(Parse("create unique index u on t (n)", 0), 0);
@@ -279,11 +292,12 @@ TEST_F(LegacyCalls, ValuesGoInPieces) {
     ub4 iteration = 9, index = 9, length = 3;
     ASSERT_EQ(Parse("insert into t values (1, :c)"), 0);
     EXPECT_EQ(ogetpi(&cda, &piece, &told, nullptr, nullptr), 24370);
-    const auto bind = [&](ub1 opcode) {
+    const auto bind = [&](ub1 opcode, sb4 skip = 0) {
         return obindps(&cda, opcode, T(":c"), -1, reinterpret_cast<ub1*>(&context), 10, SQLT_CHR, -1, nullptr, nullptr,
-                       nullptr, 0, 0, 0, 0, 0, nullptr, nullptr, -1, -1);
+                       nullptr, 0, 0, 0, skip, 0, nullptr, nullptr, -1, -1);
     };
     EXPECT_EQ(bind(2), 1025);
+    EXPECT_EQ(bind(1, -1), 1025);
     ASSERT_EQ(bind(0), 0);
     EXPECT_EQ(oexec(&cda), 3129);
     EXPECT_EQ(ofetch(&cda), 3127);
@@ -631,6 +645,7 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
         EXPECT_EQ(ofetch(&cda), 3127);
         EXPECT_EQ(ocan(&cda), 3127);
         EXPECT_EQ(oclose(&cda), 3127);
+        EXPECT_EQ(oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1), 3127) << "which would close it";
         EXPECT_EQ(oopen(&other, &lda, nullptr, -1, -1, nullptr, -1), 3127);
         for (auto* call : {ocom, orol, ologof, onbclr, onbtst}) EXPECT_EQ(call(&lda), 3127);
         OCISvcCtx* none = nullptr;
@@ -654,9 +669,15 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
     EXPECT_EQ(finish([&] { return oexn(&cda, 1, 0); }), 0);
     EXPECT_EQ(cda.rpc, 2u);
     ASSERT_EQ(Parse("select 1 / 0 from t"), 0);
-    if (server) {
-        EXPECT_EQ(finish([&] { return oexec(&cda); }), 1476);
-    }
+    if (!server) return;
+    EXPECT_EQ(finish([&] { return oexec(&cda); }), 1476);
+    // A login whose connection is lost with its work ends all the same.
+    ASSERT_EQ(Parse("delete from t where pg_terminate_backend(pg_backend_pid())"), 0);
+    EXPECT_EQ(finish([&] { return oexec(&cda); }), 3113);
+    EXPECT_EQ(ocom(&lda), 3114);
+    EXPECT_EQ(ologof(&lda), 3114);
+    EXPECT_EQ(ologof(&lda), 1001);
+    ASSERT_EQ(LogOn(lda), 0);
 }
 
 TEST_F(LegacyCalls, ABreakEndsTheCallOnce) {

@@ -5,6 +5,7 @@
 #include <future>
 #include <thread>
 
+#include "oci_legacy.h"
 #include "support/call_fixture.h"
 
 namespace {
@@ -230,6 +231,63 @@ TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
     EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_RBTIMEOUT);
     EXPECT_EQ(Code(), -2049);
     EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
+}
+
+// An area on a manager's session: by the manager's name, and given up without an end of the session.
+TEST_F(XaCalls, VersionSevenOnTheSessionsOfManagers) {
+    Lda_Def login{};
+    Cda_Def cursor{};
+    sb4 name_length = -2;
+    const auto adopt = [&](const char* name, sb4 with_length) {
+        name_length = with_length;
+        sqlld2(&login, Text(name), &name_length);
+        return login.rc;
+    };
+    const auto parse = [&](const char* sql) {
+        EXPECT_EQ(oopen(&cursor, &login, nullptr, -1, -1, nullptr, -1), 0);
+        return oparse(&cursor, Text(sql), -1, 1, 2);
+    };
+    EXPECT_EQ(adopt("one", -2), 1012);
+    EXPECT_EQ(adopt("one", 2), 1012);
+    EXPECT_EQ(adopt("one", 0), 1012) << "there is none without a name";
+    EXPECT_EQ(adopt("onetwo", 3), 0);
+    EXPECT_EQ(parse("insert into t values(1)"), 0);
+    EXPECT_EQ(oexec(&cursor), 0);
+    EXPECT_EQ(Call(kStart, Named("a", "b"), TMNOFLAGS), XAER_OUTSIDE) << "the very session";
+    EXPECT_EQ(orol(&login), 0);
+    EXPECT_EQ(Call(kStart, Named("a", "b"), TMNOFLAGS), XA_OK);
+    EXPECT_EQ(ocom(&login), 2089);
+    OCISvcCtx* service = nullptr;
+    EXPECT_EQ(Answer(OCILdaToSvcCtx(&service, err_, &login)), 24406);
+    EXPECT_EQ(adopt("two", -1), 0);
+    EXPECT_EQ(oexec(&cursor), 1001) << "gone with its login";
+    EXPECT_EQ(parse("select n from t"), 0);
+    EXPECT_EQ(oexec(&cursor), 942) << "another database";
+    EXPECT_EQ(ologof(&login), 0);
+    EXPECT_EQ(ocom(&login), 1001);
+    EXPECT_EQ(Change(), 0) << "the session goes on";
+    EXPECT_EQ(Call(kEnd, Named("a", "b"), TMFAIL), XA_OK);
+    EXPECT_EQ(Call(kRollback, Named("a", "b"), TMNOFLAGS), XA_OK);
+
+    // What is under way when the manager is closed is given up.
+    ASSERT_EQ(Open(3, "SqlNet=three"), XA_OK);
+    sqllda(&login);
+    EXPECT_EQ(parse("create table t(v varchar2(9))"), 0);
+    EXPECT_EQ(oexec(&cursor), 0);
+    EXPECT_EQ(parse("insert into t values(:v)"), 0);
+    EXPECT_EQ(obindps(&cursor, 0, Text(":v"), -1, nullptr, 10, SQLT_CHR, -1, nullptr, nullptr, nullptr, 0, 0, 0, 0, 0,
+                      nullptr, nullptr, -1, -1), 0);
+    EXPECT_EQ(oopt(&cursor, 0, 4), 0);
+    EXPECT_EQ(oexn(&cursor, 2, 0), 3129);
+    EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(ocan(&cursor), 0);
+    EXPECT_EQ(oexec(&cursor), 1012);
+    EXPECT_EQ(obreak(&login), 3114);
+    EXPECT_EQ(ocom(&login), 1012);
+    EXPECT_EQ(ologof(&login), 0);
+    ASSERT_EQ(olog(&login, nullptr, nullptr, 0, nullptr, 0, Text("three"), 5, 0), 0);
+    EXPECT_EQ(adopt("one", 3), 1015) << "no manager's: it stays what it is";
+    EXPECT_EQ(ologof(&login), 0);
 }
 
 class XaOfProcesses : public XaCalls {
