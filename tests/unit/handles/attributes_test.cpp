@@ -202,6 +202,7 @@ TEST_F(AttributesTest, ValuesThatAreRefused) {
         dvoid* const value = c.text ? const_cast<char*>(c.text) : static_cast<dvoid*>(&integer);
         EXPECT_EQ(Set(on.pointer, on.type, c.attribute, value, c.size), c.answer) << c.attribute << " " << c.integer;
     }
+    EXPECT_EQ(Set(handles.at('u').pointer, OCI_HTYPE_SESSION, OCI_ATTR_USERNAME, nullptr, 1), 24328);
     auto* attached = Attribute<OCIServer*>(handles.at('c').pointer, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
     EXPECT_EQ(Set(attached, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_GROUP, const_cast<char*>("g"), 1), 24339);
 }
@@ -225,6 +226,15 @@ TEST_F(AttributesTest, DigitsOfDatetimes) {
     for (dvoid* column : {item, Below(table, OCI_ATTR_LIST_COLUMNS, 2)}) {
         EXPECT_EQ(Attribute<ub1>(column, OCI_DTYPE_PARAM, OCI_ATTR_FSPRECISION), 3);
         EXPECT_EQ(Name(column, OCI_ATTR_LFPRECISION), "!24315");
+    }
+    // Characters that show a value.
+    ASSERT_EQ(Run("create table w(a timestamp(3) with time zone, b interval year(4) to month,"
+                  " c interval day(5) to second(6), d interval day(5) to second(0), e raw(10), f nvarchar2(7))", 1), 0);
+    ASSERT_EQ(Run("select * from w", 0), 0);
+    ub4 position = 0;
+    for (const ub4 size : {31u, 8u, 22u, 15u, 20u, 28u}) {
+        ASSERT_EQ(Member(stmt_, &item, ++position, OCI_HTYPE_STMT), 0);
+        EXPECT_EQ(Attribute<ub4>(item, OCI_DTYPE_PARAM, OCI_ATTR_DISP_SIZE), size) << position;
     }
 }
 
@@ -283,12 +293,14 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     EXPECT_EQ(OCI_memGetMemCount(), blocks);
     EXPECT_EQ(Attribute<ub1>(again, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_FORM), OnServer() ? SQLCS_IMPLICIT : SQLCS_NCHAR);
     EXPECT_EQ(Attribute<ub2>(again, OCI_DTYPE_PARAM, OCI_ATTR_CHAR_SIZE), 7);
+    EXPECT_EQ(Attribute<ub2>(again, OCI_DTYPE_PARAM, OCI_ATTR_POSITION), 3);
     EXPECT_EQ(OCIDescriptorFree(root, OCI_DTYPE_PARAM), OCI_SUCCESS);
     EXPECT_EQ(Name(again, OCI_ATTR_NAME), "C") << "its object's parameter is gone, its handle lives";
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
     columns = Attribute<dvoid*>(root, OCI_DTYPE_PARAM, OCI_ATTR_LIST_COLUMNS);
     for (const ub4 position : {0u, 4u, kHuge}) EXPECT_EQ(Member(columns, &again, position), 24334) << position;
     EXPECT_EQ(Member(columns, nullptr, 1), 21560);
+    EXPECT_EQ(Member(describe, nullptr, 1, OCI_HTYPE_DESCRIBE), 21560);
     EXPECT_EQ(Member(root, &again, 1), 24334) << "no list";
     EXPECT_EQ(Member(root, &again, 1, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
     EXPECT_EQ(Member(describe, &again, 1, OCI_HTYPE_SERVER), 24316);
@@ -335,11 +347,16 @@ TEST(Attributes, Utf16TextsStay) {
     const ub4 attributes[] = {OCI_ATTR_USERNAME, OCI_ATTR_EDITION, OCI_ATTR_CONNECTION_CLASS, OCI_ATTR_CURRENT_SCHEMA};
     const char16_t* names[4] = {};
     for (int index = 0; index < 4; ++index) {
-        const char16_t name[] = {static_cast<char16_t>(u'a' + index), u'é', 0};
-        OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char16_t*>(name), 4, attributes[index], err);
+        const char16_t name[] = {static_cast<char16_t>(u'a' + index), u'\u0100', u'é', 0, u'x'};    // ends at the zero
+        OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char16_t*>(name), sizeof name, attributes[index], err);
         EXPECT_EQ(OCIAttrGet(session, OCI_HTYPE_SESSION, &names[index], nullptr, attributes[index], err), OCI_SUCCESS);
     }
-    for (int index = 0; index < 4; ++index) EXPECT_EQ(names[index][0], u'a' + index);
+    for (int index = 0; index < 4; ++index) {
+        EXPECT_TRUE(std::u16string_view(names[index] + 1) == u"\u0100é" && names[index][0] == u'a' + index) << index;
+    }
+    char16_t half = 0xD83D;
+    EXPECT_EQ(OCIAttrSet(session, OCI_HTYPE_SESSION, &half, 2, OCI_ATTR_USERNAME, err), OCI_ERROR);
+    EXPECT_EQ(FirstCode(err), 24501);
     OCIHandleFree(env, OCI_HTYPE_ENV);
 }
 

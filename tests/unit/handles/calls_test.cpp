@@ -249,6 +249,10 @@ TEST_F(CallsTest, LogonAndLogoffOnOneContext) {
         Answer(OCILogon2(env_, err_, &svc, Text("ann"), 3, Text("secret"), 6, Text("test"), 4, OCI_LOGON2_STMTCACHE)),
         0);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
+    EXPECT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, New<OCIServer>(OCI_HTYPE_SERVER), 0, OCI_ATTR_SERVER, err_)), 24325)
+        << "the logon's own stays";
+    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION), 0)), 0);
+    EXPECT_EQ(Answer(OCIServerDetach(Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER), err_, 0)), 0);
 }
 
 TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {

@@ -10,9 +10,9 @@
 
 namespace {
 
-// What engines tell of sequences and synonyms, as attributes: numbers in the form that applications know.
+// What engines tell of sequences and synonyms, as attributes: numbers in the form that applications know, whatever form texts have.
 TEST(Parameters, SequencesAndSynonyms) {
-    Environment* const environment = Environment::Open(OCI_DEFAULT, Environment::SetsOf(OCI_DEFAULT), {}, 0);
+    Environment* const environment = Environment::Open(OCI_UTF16, Environment::SetsOf(OCI_UTF16), {}, 0);
     auto* const handle = Create<DescribeHandle>(*environment, OCI_HTYPE_DESCRIBE, 0);
     const auto get = [&](std::uint32_t attribute) -> std::string {
         void* parameter = nullptr;
@@ -37,9 +37,9 @@ TEST(Parameters, SequencesAndSynonyms) {
     object.kind = engine::ObjectKind::synonym;
     object.name = "S", object.target = "T", object.target_schema = "MAIN";
     handle->Show(describe::DescribedObject(object, {}));
-    EXPECT_EQ(get(OCI_ATTR_NAME), "T");
-    EXPECT_EQ(get(OCI_ATTR_SCHEMA_NAME), "MAIN");
-    EXPECT_EQ(get(OCI_ATTR_OBJ_NAME), "S");
+    EXPECT_EQ(get(OCI_ATTR_NAME), std::string("T\0", 2));
+    EXPECT_EQ(get(OCI_ATTR_SCHEMA_NAME), std::string("M\0A\0I\0N\0", 8));
+    EXPECT_EQ(get(OCI_ATTR_OBJ_NAME), std::string("S\0", 2));
     EXPECT_EQ(get(OCI_ATTR_LINK), "");
     Destroy(environment);
 }

@@ -77,6 +77,7 @@ protected:
 };
 
 TEST_F(Pools, NumbersOfAPool) {
+    EXPECT_EQ(Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_MAX), 0u) << "of no pool";
     const struct { ub4 least, most, step; sb4 answer; } cases[] = {
         {0, 0, 0, 24413}, {2, 1, 1, 24413}, {0, 2, 0, 24413}, {1, 0, 1, 24413}, {2, 2, 0, 0}, {0, 1, 5, 0},
         {~0U, ~0U, 1, 24413}, {0, ~0U, ~0U, 24413}, {0, ~0U, 1, 0}, {0, 1, ~0U, 0}};
@@ -205,6 +206,7 @@ TEST_F(Pools, WhatAFullPoolAnswers) {
     EXPECT_EQ(Get(&second, err_), 24418);
     ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT), 0);
     ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20), 0);
+    EXPECT_EQ(Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_WAIT_TIMEOUT), 20u);
     const auto begun = std::chrono::steady_clock::now();
     EXPECT_EQ(Get(&second, err_), 24496);
     const auto waited = std::chrono::steady_clock::now() - begun;

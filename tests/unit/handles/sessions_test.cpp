@@ -95,6 +95,20 @@ TEST_F(Sessions, AttributesFollowWhatHappens) {
     EXPECT_EQ(open(), 0u);
     ASSERT_EQ(Run(svc, New<OCIStmt>(OCI_HTYPE_STMT), err_, "select 1 from dual", 0), 0);
     EXPECT_EQ(open(), 1u);
+    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
+    auto* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
+    const auto busy = [&] { return Attribute<ub1>(server, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_BUSY); };
+    EXPECT_EQ(busy(), 0);
+    AtOnce(2, [&](int index, OCIError* err) {
+        if (index == 0) {
+            EXPECT_EQ(Run(svc, New<OCIStmt>(OCI_HTYPE_STMT), err, "insert into t with recursive r(n) as (select 1 union all"
+                          " select n + 1 from r) select count(*) from r", 1), 1013);
+            return;
+        }
+        while (busy() == 0) std::this_thread::yield();
+        EXPECT_EQ(Answer(OCIBreak(svc, err), err), 0);
+    });
+    EXPECT_EQ(busy(), 0);
     ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
     EXPECT_EQ(open(), 0u);
     EXPECT_EQ(Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION), nullptr);

@@ -90,7 +90,19 @@ TEST_F(Lobs, Utf16IsConvertedBothWays) {
     EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF0\x9F\x98\x80");
     EXPECT_EQ(Read(lob, 2, 2, 6, 1000), "2:" + data.substr(2));
     EXPECT_EQ(Read(lob, 1, 1, 10, 9999), "!24329");
-    // Torn within the pair; the second half is missing at the end.
+    for (const ub2 set : {1000, 2000}) {    // torn within the pair
+        std::string ordered = data;
+        for (std::size_t at = 0; set == 2000 && at < 8; at += 2) std::swap(ordered[at], ordered[at + 1]);
+        for (const ub4 size : {5, 6, 7}) {
+            amount = 0;
+            EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, ordered.data(), size, OCI_FIRST_PIECE, nullptr, nullptr, set,
+                                       0)), OCI_NEED_DATA);
+            EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, ordered.data() + size, 8 - size, OCI_LAST_PIECE, nullptr,
+                                       nullptr, set, 0)), 0);
+            EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF0\x9F\x98\x80") << set << ' ' << size;
+        }
+    }
+    // The second half is missing at the end.
     EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &(amount = 0), 1, data.data(), 5, OCI_FIRST_PIECE, nullptr, nullptr, 1000, 0)),
               OCI_NEED_DATA);
     EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, data.data() + 5, 1, OCI_LAST_PIECE, nullptr, nullptr, 1000, 0)),

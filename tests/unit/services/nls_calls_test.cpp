@@ -89,6 +89,10 @@ TEST_F(NlsCalls, NamesAndSettings) {
     ub2 id = 0;
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 0, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
     EXPECT_GT(id, 0);
+    setenv("LC_ALL", "no_such.locale", 1);
+    EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 0, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
+    EXPECT_EQ(id, 873);
+    unsetenv("LC_ALL");
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 1, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_ERROR);
     OCIEnv* none = nullptr;
     EXPECT_EQ(OCIEnvNlsCreate(&none, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr, 7, 0), OCI_ERROR);
@@ -130,6 +134,13 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
         set = 7;
         EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &set, 0, OCI_ATTR_CHARSET_ID, err_)), 24329);
     }
+    OCIDefine* padded = nullptr;
+    char area[8] = "";
+    ub2 wide = 2000;
+    EXPECT_EQ(Answer(OCIDefineByPos(statement, &padded, err_, 1, area, 8, SQLT_AFC, nullptr, nullptr, nullptr, 0)), 0);
+    EXPECT_EQ(Answer(OCIAttrSet(padded, OCI_HTYPE_DEFINE, &wide, 0, OCI_ATTR_CHARSET_ID, err_)), 0);
+    EXPECT_EQ(Answer(OCIStmtExecute(svc, statement, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
+    EXPECT_EQ(std::string_view(area, 8), std::string_view("\0\xe9\x20\xac\0 \0 ", 8));
     dvoid* column = nullptr;
     OraText* name = nullptr;
     ub4 size = 0;

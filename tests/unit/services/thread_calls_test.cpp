@@ -1,4 +1,6 @@
 // The thread package: its objects, their misuse, and many threads at once.
+#include <pthread.h>
+
 #include <atomic>
 #include <thread>
 #include <vector>
@@ -71,6 +73,25 @@ TEST_F(ThreadCalls, HandlesAreJoinedOnceAndClosedOnce) {
     EXPECT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 21560) << "oneself";
     EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, nullptr)), 0);
     while (destroyed == 0) std::this_thread::yield();
+}
+
+// Without room for its stack there is no thread, and what was to become its id and handle stay what they were.
+TEST_F(ThreadCalls, AThreadThatCannotStart) {
+    OCIThreadHandle* handle = NewHandle();
+    OCIThreadId *id = NewId(), *own = NewId();
+    ASSERT_EQ(Answer(OCIThreadIdGet(env_, err_, id)), 0);
+    ASSERT_EQ(Answer(OCIThreadIdGet(env_, err_, own)), 0);
+    pthread_attr_t usual, huge;
+    pthread_getattr_default_np(&usual);
+    pthread_attr_init(&huge);
+    pthread_attr_setstacksize(&huge, std::size_t{1} << 60);
+    ASSERT_EQ(pthread_setattr_default_np(&huge), 0);
+    EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, id, handle)), 21500);
+    EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, nullptr)), 21500);
+    pthread_setattr_default_np(&usual);
+    EXPECT_EQ(destroyed, 0);
+    EXPECT_TRUE(Same(id, own));
+    EXPECT_EQ(Answer(OCIThreadClose(env_, err_, handle)), 21560) << "no thread yet";
 }
 
 TEST_F(ThreadCalls, KeysHoldAValueForEachThread) {
