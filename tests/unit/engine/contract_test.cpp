@@ -1144,7 +1144,7 @@ TEST_P(ServerObjects, AreWrittenWhereTheyLie) {
 TEST_P(ServerObjects, AreReadAsTheyAreNow) {
     const Kept lists[] = {Plain("select c from o where k = 3"), Plain("select o.c from o, l where o.k = 3"),
                           Plain("select distinct c from o where k = 3")};
-    const auto query = Opened("select c, k from o where k <> 2 order by k");
+    auto query = Opened("select c, k from o where k <> 2 order by k");
     Taking rows(*connection_->Lobs());
     bool more = true;
     ASSERT_EQ(Answer(query->Fetch(rows, 1, more)), 0);
@@ -1162,6 +1162,7 @@ TEST_P(ServerObjects, AreReadAsTheyAreNow) {
     EXPECT_EQ(Read(*lists[0]), "error 22922");
     EXPECT_EQ(Answer(lists[0]->Length(length)), 22922);
     EXPECT_FALSE(connection_->InTransaction());
+    query.reset();
     connection_.reset();
     EXPECT_EQ(Read(*lists[0]), "error 22275");
 }
