@@ -35,7 +35,7 @@ bool TakesWord(const Element& element) {
     return !TakesNumber(element) && element.field >= Field::year && element.field != Field::radix &&
            element.field != Field::zone_region;
 }
-bool MayBeMissing(const Element& element) { return element.field >= Field::half_day || element.field == Field::mark; }
+bool MayBeMissing(const Element& element) { return element.field >= Field::half_day; }
 
 class Parser {
 public:

@@ -57,6 +57,8 @@ TEST_F(DateCalls, ResultsAreWrittenOnSuccessOnly) {
     EXPECT_EQ(Answer(OCIDateAddDays(err_, &day, 2147483647, &day)), 1841);
     EXPECT_EQ(Answer(OCIDateNextDay(err_, &day, Text("XYZ"), 3, &day)), 1846);
     EXPECT_EQ(day.OCIDateYYYY, 2025);
+    EXPECT_EQ(Answer(OCIDateNextDay(err_, &day, Text("SUNDAY"), 6, &day)), 0);
+    EXPECT_EQ(day.OCIDateMM * 100 + day.OCIDateDD, 302);
 }
 
 TEST_F(DateCalls, TextsAreWrittenToTheByte) {
@@ -66,6 +68,7 @@ TEST_F(DateCalls, TextsAreWrittenToTheByte) {
     EXPECT_EQ(Answer(OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, &size, Text(area))), 0);
     EXPECT_STREQ(area, "09-FEB-24..");
     EXPECT_EQ(size, 9u);
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, nullptr, Text(area))), 21560);
     size = 8;
     EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text("YYYY-MM-DD"), 10, nullptr, 0, &size, Text(area))), 22059);
     EXPECT_EQ(size, 10u);

@@ -43,7 +43,7 @@ TEST(DateToText, EachElement) {
         {"2024-09-04", "DAY Day day fmDay DY Dy dy D", "WEDNESDAY Wednesday wednesday Wednesday WED Wed wed 4"},
         {"2024-09-01", "DAY|D", "SUNDAY   |1"},
         {"2024-12-30", "DDD DD WW W IW IYYY IYY IY I", "365 30 53 5 01 2025 025 25 5"},
-        {"2021-01-03", "DDD WW W IW IYYY", "003 01 1 53 2020"}, {"1582-10-15", "DDD J", "278 2299161"}, {"2021-01-07", "WW W", "01 1"},
+        {"2021-01-03", "DDD WW W IW IYYY", "003 01 1 53 2020"}, {"1582-10-15", "DDD J", "278 2299161"}, {"2021-01-07", "WW W", "01 1"}, {"2026-01-08", "IW", "02"},
         {"-4712-01-01", "J", "0000001"}, {"9999-12-31", "J", "5373484"},
         {"2024-02-09 00:05:09", "HH HH12 HH24 MI SS SSSSS AM", "12 12 00 05 09 00309 AM"},
         {"2024-02-09 12:05:09", "HH HH24 PM P.M. a.m. Am", "12 12 PM P.M. p.m. Pm"},
@@ -139,6 +139,8 @@ TEST(DateFromText, Reads) {
         {"2024-01-01 10-05:30", "YYYY-MM-DD HH24,TZR", "2024-01-01 10:00:00 -05:30"},
         {"2024-01-01 10,+05:30", "YYYY-MM-DD HH24 TZH:TZM", "2024-01-01 10:00:00 +05:30"},
         {"2024-1-1 1:02:035", "YYYY-MM-DD HH24:MI:SS.FF", "2024-01-01 01:02:03.5"},
+        {"202402295", "YYYYMMDD-\"5\"", "2024-02-29 00:00:00"},
+        {"2024-02-29 3661 01:01:01", "YYYY-MM-DD SSSSS HH24:MI:SS", "2024-02-29 01:01:01"},
         {"29 may 2024", "DD-MM-YYYY", "2024-05-29 00:00:00"}, {"May of 2024", "MONTH\" of \"YYYY", "2024-05-01 00:00:00"},
         {"May 2024", "FXFMMonth YYYY", "2024-05-01 00:00:00"}, {"1-2-3,25", "YYYY-MM-DDXFF", "0001-02-03 00:00:00.25"},
         {"2024-1-1 1.5", "FXFMYYYY-MM-DD SSXFF3", "2024-01-01 00:00:01.5"},
@@ -160,7 +162,7 @@ TEST(DateFromText, Refuses) {
         {"0 AM", "HH12 AM", 1849}, {"24", "HH24", 1850}, {"60", "MI", 1851}, {"60", "SS", 1852},
         {"86400", "SSSSS", 1853}, {"8", "D", 1846}, {"FUNDAY", "DAY", 1846}, {"10 XM", "HH AM", 1855},
         {"10 44 XX", "HH YYYY BC", 1856}, {"a024", "YYYY", 1858}, {"123", "DAY", 1859}, {"10 1", "HH AM", 1859},
-        {"2012-01-05", "DD-MON-RR", 1861}, {"2024x02", "YYYY-MM", 1861}, {"2024-ab", "YYYY\"-ac\"", 1861},
+        {"2012-01-05", "DD-MON-RR", 1861}, {"2024x02", "YYYY-MM", 1861}, {"2024\x7f" "02", "YYYY-MM", 1861}, {"2024-ab", "YYYY\"-ac\"", 1861},
         {"2024/02/01", "FXYYYY-MM-DD", 1861}, {"2024-02-01 ", "FXYYYY-MM-DD", 1830},
         {"1999 MAY       ", "FXYYYY MONTH", 1830}, {"2024-2-01", "FXYYYY-MM-DD", 1862}, {"2,24", "Y,YYY", 1862},
         {"x", "Y,YYY", 1858}, {"-+44", "SYYYY", 1858}, {"200405", "YY-MM", 1830}, {"0140201", "MM-YY", 1830},
@@ -191,6 +193,8 @@ TEST(DateFromText, MissingFieldsAreOfToday) {
     EXPECT_EQ(value.year, now.year);
     EXPECT_EQ(value.month, now.month);
     EXPECT_EQ(value.day, 1);
+    ASSERT_EQ(FromText("02-03", "MM-DD", kEnglish, Scope::date, &value), 0);
+    EXPECT_EQ(value.year, now.year);
     const int century = now.year - now.year % 100;
     ASSERT_EQ(FromText("01-01-07", "DD-MM-YY", kEnglish, Scope::date, &value), 0);
     EXPECT_EQ(value.year, century + 7);

@@ -75,6 +75,8 @@ TEST_F(IntervalCalls, TextsAreReadAndWritten) {
     EXPECT_EQ(length, 6u);
     EXPECT_EQ(Answer(OCIIntervalToText(env_, err_, Read("2-3", true), 2, 0, Text(area), 6, &length)), 0);
     EXPECT_STREQ(area, "+02-03??");
+    EXPECT_EQ(Answer(OCIIntervalToText(env_, err_, Read("2-3", true), 2, 0, Text(area), 7, &length)), 0);
+    EXPECT_STREQ(area, "+02-03");
 }
 
 TEST_F(IntervalCalls, PartsHaveLimitsAndOneSign) {
@@ -128,6 +130,8 @@ TEST_F(IntervalCalls, WhatIsMissingOrUnset) {
         {Answer(OCIDateTimeToText(env_, err_, unset, nullptr, 0, 9, nullptr, 0, &size, text)), 1866},
         {Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, moment, nullptr, &offset)), 21560},
         {Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, moment, &offset, nullptr)), 21560},
+        {Answer(OCIDateTimeGetTimeZoneName(env_, err_, moment, text, nullptr)), 21560},
+        {Answer(OCIIntervalGetDaySecond(env_, err_, nullptr, part, part, part, part, days)), 21560},
         {Answer(OCIIntervalGetDaySecond(env_, err_, part, part, part, part, nullptr, days)), 21560},
         {Answer(OCIIntervalGetDaySecond(env_, err_, part, part, part, part, part, months)), 1867},
         {Answer(OCIIntervalGetYearMonth(env_, err_, part, nullptr, months)), 21560},
@@ -218,16 +222,21 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     EXPECT_EQ(Shown(moment, "SS.FF", 0), "15.");
     EXPECT_EQ(Shown(moment, "SS.FF2", 9), "15.98");
     EXPECT_EQ(Shown(moment, "SS", 10), "30088");
-    const struct { const char* text; const char* name; int hour, minute; } zones[] = {
-        {"2024-07-15 00:00:00 Europe/Paris", "Europe/Paris", 2, 0}, {"2024-07-15 00:00:00 -03:30", "-03:30", -3, -30}};
+    const struct { const char* text; const char* name; int hour, minute, winter; } zones[] = {
+        {"2024-07-15 00:00:00 Europe/Paris", "Europe/Paris", 2, 0, 1}, {"2024-07-15 00:00:00 -03:30", "-03:30", -3, -30, -3},
+        {"2024-07-15 00:00:00 +00:00", "+00:00", 0, 0, 0}, {"2024-07-15 00:00:00 +14:00", "+14:00", 14, 0, 14}};
     for (const auto& c : zones) {
-        sb1 hour = 0, minute = 0;
+        sb1 hour = 0, minute = 0, winter = 99;
         ub1 name[20];
         ub4 size = sizeof name;
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, Moment(c.text), &hour, &minute)), 0);
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneName(env_, err_, Moment(c.text), name, &size)), 0);
         EXPECT_EQ(std::string(reinterpret_cast<char*>(name), size), c.name);
         EXPECT_EQ(hour * 100 + minute, c.hour * 100 + c.minute) << c.name;
+        OCIDateTime* later = Moment(c.text);
+        EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, later, 2025, 1, 15)), 0);
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, later, &winter, &minute)), 0);
+        EXPECT_EQ(winter, c.winter) << c.name;
         size = 5;
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneName(env_, err_, moment, name, &size)), 22059);
         EXPECT_EQ(size, 12u);
@@ -238,6 +247,8 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     auto* date = NewDescriptor<OCIDateTime>(OCI_DTYPE_DATE);
     EXPECT_EQ(Answer(OCIDateTimeConvert(env_, err_, Moment("2024-07-15 10:00:00.5 +01:00"), date)), 0);
     EXPECT_EQ(Shown(date, ""), "15-JUL-24");
+    EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, date, 2024, 7, 16, 13, 14, 15, 0, nullptr, 0)), 0);
+    EXPECT_EQ(Shown(date, "DD HH24:MI:SS"), "16 00:00:00");
     auto* now = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     EXPECT_EQ(Answer(OCIDateTimeSysTimeStamp(env_, err_, now)), 0);
     sword order = 0;

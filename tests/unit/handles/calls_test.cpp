@@ -281,6 +281,7 @@ TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {
     EXPECT_EQ(set(session, OCI_HTYPE_SESSION, OCI_ATTR_PASSWORD, const_cast<char*>("secret"), 6), 0);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, 77, 0)), 24323);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, OCI_STMT_CACHE)), 0);
+    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, session, OCI_CRED_RDBMS, 0)), 24313);
     EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 1012) << "begun, but not set in the context";
     EXPECT_EQ(set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION, session), 0);

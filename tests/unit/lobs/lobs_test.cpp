@@ -302,8 +302,11 @@ TEST_F(Lobs, BindsAndReturningTakeLocators) {
     EXPECT_EQ(Write(other, 1, "returned"), 0);
     EXPECT_EQ(One("select group_concat(c, '|') from l where k > 1"), "by bind|returned");
     boolean flag = TRUE;
-    EXPECT_EQ(OCILobIsEqual(env, lob, other, &flag), OCI_SUCCESS);
-    EXPECT_EQ(flag, FALSE);
+    auto* empty = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    for (OCILobLocator* one : {lob, empty}) {
+        EXPECT_EQ(OCILobIsEqual(env, one, other, &flag), OCI_SUCCESS);
+        EXPECT_EQ(flag, FALSE);
+    }
     Fetch(lob, "select x.c from l x where k = 3");
     EXPECT_EQ(OCILobIsEqual(env, lob, other, &flag), OCI_SUCCESS);
     EXPECT_EQ(flag, TRUE);

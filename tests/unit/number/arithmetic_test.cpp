@@ -4,6 +4,7 @@
 #include <cmath>
 
 #include "number/add_wide.h"
+#include "number/format.h"
 #include "reference.h"
 
 namespace {
@@ -180,7 +181,7 @@ TEST(NumberArithmetic, RangeAndDomainErrors) {
         {number::Add, "9.9E125", "9.9E125", 22053}, {number::Mul, "1E100", "1E26", 22053},
         {number::Mul, "1E-100", "1E-31", 22054}, {number::Sub, "1.01E-130", "1E-130", 22054},
         {number::Div, "1", "0", 22056}, {number::Div, "0", "0", 22056}, {number::Mod, "5", "0", 22056},
-        {number::Div, "1E-100", "1E31", 22054}};
+        {number::Div, "1E-100", "1E31", 22054}, {number::Div, "0", "-5", 0}};
     for (const auto& c : cases) {
         OCINumber got;
         EXPECT_EQ(c.function(Number(c.left), Number(c.right), &got), c.error) << c.left << " " << c.right;
@@ -256,6 +257,10 @@ TEST(NumberArithmetic, InfinitiesCompareButDoNotCompute) {
         EXPECT_EQ(got, plus) << c.text;
         EXPECT_TRUE(sign == c.sign && whole == 0 && zero == 0 && real == c.sign * HUGE_VAL) << c.text;
         EXPECT_EQ(Shown(c.value), c.text);
+        char text[4] = "";
+        std::size_t length = 0;
+        EXPECT_EQ(number::ToText(c.value, "999", {}, text, 3, &length), 0);
+        EXPECT_STREQ(text, c.text) << "by any model";
         EXPECT_EQ(number::ToInteger(c.value, 8, true, &bits), c.integer);
     }
     EXPECT_EQ(number::Add(plus, minus, &got), 22053);

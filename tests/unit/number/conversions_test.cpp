@@ -13,6 +13,9 @@ TEST(NumberIntegers, WhatNoIntegerHolds) {
     EXPECT_EQ(number::ToInteger(Number("1E30"), 8, true, &bits), 22053);
     EXPECT_EQ(number::ToInteger(Number("-1E125"), 8, true, &bits), 22054);
     EXPECT_EQ(number::ToInteger(Number("1"), 3, true, &bits), 22057);
+    EXPECT_EQ(number::ToInteger(Number("-9223372036854775809"), 8, true, &bits), 22054);
+    EXPECT_EQ(number::ToInteger(Number("9223372036854775808"), 8, true, &bits), 22053);
+    EXPECT_EQ(number::ToInteger(Number("-1"), 8, false, &bits), 22054);
     EXPECT_EQ(number::ToInteger(Number("-0.5"), 1, false, &bits), 0);
     EXPECT_EQ(bits, 0u);
 }

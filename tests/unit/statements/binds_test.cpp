@@ -322,6 +322,7 @@ TEST_F(Binds, WideForms) {
     EXPECT_EQ(OCIStmtGetNextResult(stmt, err, &result, &type, OCI_DEFAULT), OCI_NO_DATA);
     EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, &type, 1)), 24300);
     EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, nullptr, OCI_DEFAULT)), 21560);
+    EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, nullptr, &type, OCI_DEFAULT)), 21560);
     EXPECT_EQ(OCIStmtGetNextResult(nullptr, err, &result, &type, OCI_DEFAULT), OCI_INVALID_HANDLE);
 }
 

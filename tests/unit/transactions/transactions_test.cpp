@@ -139,6 +139,7 @@ TEST_F(Transactions, SeveralAreReadiedInOneCall) {
     OCITrans* one_missing[2] = {branches[0], nullptr};
     EXPECT_EQ(OCITransMultiPrepare(svc_[1], 2, one_missing, errors), OCI_INVALID_HANDLE);
     EXPECT_EQ(OCITransMultiPrepare(svc_[1], 0, branches, errors), OCI_INVALID_HANDLE);
+    EXPECT_EQ(OCITransMultiPrepare(svc_[1], 2, branches, nullptr), OCI_INVALID_HANDLE);
     EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_TRANS_TWOPHASE)), 0);
     EXPECT_EQ(Run(1, "insert into t select 1 / count(*) from t"), 0);
 }

@@ -150,6 +150,15 @@ TEST_F(XaCalls, InfoStrings) {
     EXPECT_EQ(Open(3, "DB=" + std::string(MAXINFOSIZE - 3, 'x')), XAER_INVAL);
     // Of several without a name none is the one.
     EXPECT_EQ(Open(3, "SqlNet=three"), XA_OK);
+    const struct { const char* name; sb4 length; ub2 answer; } logins[] = {
+        {nullptr, -2, 0}, {"one", -2, 1012}, {"one", -1, 0}, {"ones", 3, 0}, {"ones", -1, 1012}, {"ones", 0, 0}};
+    for (const auto& c : logins) {
+        Lda_Def login{};
+        sb4 length = c.length;
+        sqlld2(&login, Text(c.name), &length);
+        EXPECT_EQ(login.rc, c.answer) << c.length;
+        EXPECT_EQ(ologof(&login), c.answer == 0 ? 0 : 1001) << c.length;
+    }
     EXPECT_EQ(Open(4, "SqlNet=four"), XA_OK);
     EXPECT_EQ(xaoSvcCtx(nullptr), nullptr);
     for (const int rmid : {3, 4}) EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, rmid, TMNOFLAGS), XA_OK);

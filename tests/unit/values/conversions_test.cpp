@@ -224,6 +224,11 @@ TEST_F(Conversions, PackedDecimalWithScale) {
     ASSERT_EQ(Prepare("select 1234.5 from dual"), 0);
     ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
     EXPECT_EQ(Execute(1), 1457) << "six digits, and the precision is five";
+    precision = 1;
+    ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &precision, 0, OCI_ATTR_PDPRC, err)), 0);
+    ASSERT_EQ(Prepare("select 0.12 from dual"), 0);
+    ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
+    EXPECT_EQ(Execute(1), 1457);
 }
 
 TEST_F(Conversions, Dates) {
