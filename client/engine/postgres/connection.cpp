@@ -7,7 +7,9 @@
 #include <utility>
 
 #include "engine/postgres/lob_store.h"
+#include "engine/pieces.h"
 #include "engine/postgres/query.h"
+#include "engine/postgres/question.h"
 #include "engine/postgres/types.h"
 #include "handles/errors.h"
 
@@ -186,20 +188,14 @@ void PgConnection::Forget(const std::string& name) noexcept try {
 }
 
 Status PgConnection::Ask(const char* sql, const std::vector<std::string>& values, Result& result) {
-    if (Status status = Enter(); !status.Ok()) return status;
-    std::vector<const char*> data;
-    for (const std::string& value : values) data.push_back(value.c_str());
-    wire_->SendQuery(sql, data);
-    wire_->Sync();
-    Status status = wire_->Drain(&result);
-    Note();
-    return status.Ok() || !in_transaction_ ? status : Lose(status);
+    const Question question(values);
+    return AskGuarded(sql, question.values, result, false);
 }
 
-Status PgConnection::AskGuarded(const std::string& sql, const Wire::Values& values, Result& result) {
+Status PgConnection::AskGuarded(const std::string& sql, const Wire::Values& values, Result& result, bool binary_results) {
     if (Status status = Enter(); !status.Ok()) return status;
     const Guard guard = SendGuard(false);
-    wire_->SendQuery(sql.c_str(), values, true);
+    wire_->SendQuery(sql.c_str(), values, binary_results);
     SendRelease(guard);
     Status status = PassGuard(guard);
     while (status.Ok()) {
@@ -374,42 +370,33 @@ Status PgConnection::DropMark() {
 
 // ---- Savepoints of applications
 
-namespace {
-
-// The next word of a text, as the server reads it: what stands in quotes is another name only where it has other letters.
-std::string TakeWord(std::string_view& text) {
-    const auto is_blank = [](char c) { return c == ' ' || c == '\t' || c == '\n'; };
-    while (!text.empty() && is_blank(text.front())) text.remove_prefix(1);
-    std::string word;
-    const bool quoted = text.starts_with('"');
-    for (text.remove_prefix(quoted); !text.empty(); text.remove_prefix(1)) {
-        const char c = text.front();
-        if (quoted && c == '"') {
-            text.remove_prefix(1);
-            if (!text.starts_with('"')) break;
-        }
-        if (!quoted && (is_blank(c) || c == ';')) break;
-        word += !quoted && c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-    }
-    return word;
-}
-
-}  // namespace
-
+// What has more behind its name is left to the server, as a statement like any other.
 PgConnection::SavepointCommand PgConnection::ReadSavepoint(std::string_view sql) {
-    using Verb = SavepointCommand::Verb;
-    const std::string first = TakeWord(sql);
-    const bool sets = first == "savepoint";
-    if (!sets && first != "rollback" && first != "release") return {};
-    std::string word = TakeWord(sql);
-    if (first == "rollback") {
-        if (word == "work" || word == "transaction") word = TakeWord(sql);
-        if (word != "to") return {};
-        word = TakeWord(sql);
+    const PieceList pieces = Split(sql);
+    std::size_t at = 0;
+    const auto takes = [&](std::string_view word) { return at < pieces.size() && IsWord(pieces[at], word) && ++at > 0; };
+    SavepointCommand command;
+    if (takes("savepoint")) {
+        command.verb = SavepointCommand::Verb::set;
+    } else if (takes("release")) {
+        command.verb = SavepointCommand::Verb::drop;
+        (void)takes("savepoint");
+    } else if (takes("rollback")) {
+        command.verb = SavepointCommand::Verb::undo;
+        (void)(takes("work") || takes("transaction"));
+        if (!takes("to")) return {};
+        (void)takes("savepoint");
     }
-    if (!sets && word == "savepoint") word = TakeWord(sql);
-    if (word.empty()) return {};
-    return {sets ? Verb::set : first == "rollback" ? Verb::undo : Verb::drop, word};
+    if (at == 0 || at == pieces.size() || !IsName(pieces[at])) return {};
+    const std::string_view name = pieces[at++];
+    if (at < pieces.size() && pieces[at] == ";") ++at;
+    if (at < pieces.size()) return {};
+    command.name = PlainName(name);
+    if (command.name.empty()) return {};
+    if (!name.starts_with('"')) {
+        for (char& c : command.name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    }
+    return command;
 }
 
 Status PgConnection::CheckSavepoint(const SavepointCommand& command) {

@@ -121,10 +121,9 @@ public:
     void Stream(PgQuery* query) noexcept { streaming_ = query; }
     [[nodiscard]] bool Streams(const PgQuery* query) const { return streaming_ == query; }
 
-    // Rows of a question of the engine's own, with texts as values.
-    Status Ask(const char* sql, const std::vector<std::string>& values, Result& result);
-    // The same, which undoes itself when it fails, as a statement of the application's does. Results are binary.
-    Status AskGuarded(const std::string& sql, const Wire::Values& values, Result& result);
+    // Rows of a question of the engine's own, which undoes itself when it fails, as a statement of the application's does.
+    Status AskGuarded(const std::string& sql, const Wire::Values& values, Result& result, bool binary_results = true);
+    Status Ask(const char* sql, const std::vector<std::string>& values, Result& result);    // texts for texts
 
 private:
     Status SetPath();

@@ -184,10 +184,6 @@ Status Refused(int number, std::string_view words) noexcept {
     }
 }
 
-bool IsState(const PGresult* result, std::string_view state) noexcept {
-    return Field(result, PG_DIAG_SQLSTATE) == state;
-}
-
 Status Failure(const PGresult* result, Verb verb) noexcept {
     const std::string_view words = Field(result, PG_DIAG_MESSAGE_PRIMARY);
     if (words.empty()) return Refused(errors::kOutOfMemory, Trimmed(PQresultErrorMessage(result)));

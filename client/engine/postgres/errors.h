@@ -23,9 +23,6 @@ Status ConnectFailure(std::string_view message) noexcept;
 // An error of this engine's own.
 Status Refused(int number, std::string_view words = {}) noexcept;
 
-// Whether the error is of that SQLSTATE.
-bool IsState(const PGresult* result, std::string_view state) noexcept;
-
 // A failure that has taken the transaction with it: the record says so, too.
 Status RolledBack(const Status& failure) noexcept;
 

@@ -72,7 +72,9 @@ Status Home::Log(const Credentials& credentials, std::shared_ptr<const StopReque
     if (has_zero) return Refused(errors::kBadLogon);
     Parameters parameters{{{"dbname", url_}, {"fallback_application_name", "libkelpci"}, {"client_encoding", "UTF8"}}};
     if (!credentials.external) {
-        parameters.values.emplace_back("user", RoleName(credentials.user));
+        const std::string role = RoleName(credentials.user);
+        if (role.empty()) return Refused(errors::kBadLogon);    // libpq would take another
+        parameters.values.emplace_back("user", role);
         parameters.values.emplace_back("password", credentials.password);
     }
     std::unique_ptr<Wire> made;

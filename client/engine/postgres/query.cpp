@@ -279,7 +279,7 @@ Status PgQuery::ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& 
     Status status = Load(source, row);
     if (!status.Ok()) return status;
     Wire& server = connection_.Server();
-    for (bool again = true; again; again = IsStale(status) && PrepareAnew().Ok()) {
+    for (int runs = 0; runs == 0 || (runs == 1 && IsStale(status) && PrepareAnew().Ok()); ++runs) {
         const PgConnection::Guard guard = connection_.SendGuard(false);
         server.SendExecute(name_.c_str(), bound_.Values(), binary_);
         connection_.SendRelease(guard);
@@ -318,6 +318,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
     std::uint32_t size = kLargestBatch;
     std::uint32_t stop = run.last;
     std::uint32_t singly = run.first;    // rows below go one by one
+    bool renewed = false;
     for (std::uint32_t row = run.first; row < run.last;) {
         const bool was_in_transaction = connection_.InTransaction();
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
@@ -349,6 +350,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         if (failure.Ok()) failure = std::move(batch.refusal);
         if (failure.Ok()) continue;
         if (connection_.Broken() || (was_in_transaction && !connection_.InTransaction())) return failure;
+        if (IsStale(failure) && !std::exchange(renewed, true) && PrepareAnew().Ok()) continue;
         const bool stops = !run.all_rows || failure.Number() == errors::kCancelled;
         outcome.failures.push_back({row, std::move(failure)});
         if (stops) break;

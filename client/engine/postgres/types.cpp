@@ -153,6 +153,7 @@ int ReadCursor(std::string_view bytes, ValueRoom&, Datum& value) {
 int TextToBool(std::string_view text, ValueRoom&, Datum& value) { return GiveInteger(text == "t", value); }
 
 int TextToNumber(std::string_view text, ValueRoom& room, Datum& value) {
+    if (text.ends_with("Infinity")) return errors::kNumericOverflow;
     std::int64_t integer = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), integer);
     if (error == std::errc() && end == text.data() + text.size()) return GiveInteger(integer, value);
@@ -165,6 +166,7 @@ int TextToReal(std::string_view text, ValueRoom&, Datum& value) {
 }
 
 int TextToDate(std::string_view text, ValueRoom& room, Datum& value) {
+    if (text.ends_with("infinity")) return errors::kBadYear;
     return GiveDate(date::FromEngineText(text, &room.date), room, value);
 }
 

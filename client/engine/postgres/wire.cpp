@@ -136,11 +136,6 @@ void Wire::Send(const char* sql) noexcept {
     Sent(PQsendQueryParams(connection_, sql, 0, nullptr, nullptr, nullptr, nullptr, 0));
 }
 
-void Wire::SendQuery(const char* sql, const std::vector<const char*>& texts) noexcept {
-    if (broken_ || short_of_memory_) return;
-    Sent(PQsendQueryParams(connection_, sql, static_cast<int>(texts.size()), nullptr, texts.data(), nullptr, nullptr, 0));
-}
-
 void Wire::SendQuery(const char* sql, const Values& values, bool binary_results) noexcept {
     const AtOnce whole(*this, values);
     if (broken_ || short_of_memory_) return;

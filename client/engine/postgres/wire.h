@@ -56,7 +56,6 @@ public:
 
     // ---- Sending. A failure breaks off; what was sent before is read by Drain.
     void Send(const char* sql) noexcept;
-    void SendQuery(const char* sql, const std::vector<const char*>& texts) noexcept;    // with texts as values
     struct Values {
         std::vector<const char*> data;    // null: null
         std::vector<int> lengths, formats;

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <gtest/gtest.h>
+#include <strings.h>
 
 #include <cstdio>
 #include <cstdlib>
@@ -125,7 +126,7 @@ struct Written : engine::RowSink {
 };
 
 inline Effect EffectOf(std::string_view sql) {
-    const auto begins = [&](std::string_view word) { return sql.starts_with(word); };
+    const auto begins = [&](std::string_view word) { return sql.size() > word.size() && strncasecmp(sql.data(), word.data(), word.size()) == 0; };
     const bool is_change_behind_with = begins("with") && sql.find("insert into") != std::string_view::npos;
     if (is_change_behind_with || begins("insert") || begins("update") || begins("delete")) return Effect::changes;
     if (begins("create") || begins("drop") || begins("alter")) return Effect::defines;

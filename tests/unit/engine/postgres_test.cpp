@@ -7,6 +7,7 @@
 #include <thread>
 
 #include "engine/engine_fixture.h"
+#include "number/digits.h"
 #include "support/postgres_database.h"
 
 namespace {
@@ -155,6 +156,7 @@ TEST_F(Postgres, CursorsAndNotices) {
     EXPECT_TRUE(connection_->InTransaction()) << "cursors live in one";
     const auto notices = connection_->TakeNotices();
     ASSERT_EQ(notices.size(), 1u);
+    EXPECT_EQ(notices[0].Number(), 20000);
     EXPECT_EQ(notices[0].Detail(), "hello");
     EXPECT_FALSE(notices[0].Failed());
 }
@@ -162,8 +164,9 @@ TEST_F(Postgres, CursorsAndNotices) {
 TEST_F(Postgres, WhatTheServerSaysAsNumbers) {
     ASSERT_EQ(Run("create table p(n integer primary key)"), 0);
     ASSERT_EQ(Run("create table c(n integer not null check (n < 9), p integer references p, v varchar(2), k numeric(2))"), 0);
-    ASSERT_EQ(Run("insert into p values(1)"), 0);
-    ASSERT_EQ(Run("insert into c values(1, 1, 'a', 1)"), 0);
+    MustRun("create table r(r real, i integer)", "create view w as select n from p where n > 0 with check option");
+    MustCommit("insert into p values(1)", "insert into c values(1, 1, 'a', 1)");
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
     const struct { const char* sql; int number; } cases[] = {
         {"insert into p values(1)", 1},            {"insert into c(n) values(null)", 1400},
         {"update c set n = null", 1407},           {"insert into c(n) values(9)", 2290},
@@ -175,12 +178,158 @@ TEST_F(Postgres, WhatTheServerSaysAsNumbers) {
         {"select (select n from p union all select 2)", 1427}, {"create table p(n integer)", 955},
         {"select max(n), n from p", 937},          {"select 1 'x", 1756},
         {"insert into p values(1, 2)", 913},       {"select 1; select 2", 933},
-        {"alter table c add foreign key(n, p) references p(n)", 2270}};
+        {"alter table c add foreign key(n, p) references p(n)", 2270}, {"UPDATE c set n = null", 1407},
+        {"insert into c(n, p) values(1)", 947},    {"select 1 where", 921},
+        {"select 1 union select 1, 2", 1789},      {"select (select 1, 2)", 913},
+        {"select max(n) from p where max(n) = 1", 934}, {"select n = '\\x01'::bytea from p", 932},
+        {"select * from p, p", 918},               {"select cast('x' as nosuch)", 902},
+        {"select cast('x' as tid)", 1410},         {"select cast('\\x1' as bytea)", 1465},
+        {"select cast('\\xZZ' as bytea)", 1465},   {"select now() at time zone 'nowhere'", 1882},
+        {"select cast('x' as date)", 1861},        {"select cast('2024-13-01' as date)", 1839},
+        {"select cast(32768 as int2)", 1426},      {"select cast(1e39 as real)", 1426},
+        {"insert into r values(1e39)", 1426},      {"insert into r(i) values(1e39)", 1438},
+        {"select n from p limit -1", 1428},        {"select chr(0)", 1489},
+        {"drop table p", 2303},                    {"drop index nowhere", 1418},
+        {"drop sequence nowhere", 2289},           {"drop schema nowhere", 4043},
+        {"alter table p add n integer", 957},      {"create schema kelp", 955},
+        {"grant select on p to nobody", 1435},     {"deallocate nowhere", 1003},
+        {"close nowhere", 1001},                   {"insert into w values(0)", 1402}};
     for (const auto& c : cases) {
         const std::string answer = EffectOf(c.sql) == Effect::reads ? Query(c.sql) : "error " + std::to_string(Run(c.sql));
         EXPECT_EQ(answer, "error " + std::to_string(c.number)) << c.sql;
     }
     EXPECT_EQ(Query("select count(*) from c"), "1;") << "and the transaction goes on";
+}
+
+// What code in the server raises, which may be anything: states, their numbers, and words that count.
+TEST_F(Postgres, StatesAsNumbers) {
+    const char* const cases[] = {
+        "02000 1403",  "08001 3113",  "0A000 1022",  "0A000 1466 cached plan", "22004 1405",  "22009 1857",  "22018 1722",
+        "22021 911",   "22000 1428",  "23001 2292",  "23P01 1",     "23000 2290",  "24000 1001",  "25P02 2091",  "26000 1003",
+        "28000 1017",  "3D000 12514", "40001 8177",  "40P01 60",    "40003 2091",  "42501 1031",  "42602 931",   "42611 902",
+        "42622 972",   "42710 955",   "42712 918",   "42723 955",   "42809 942",   "42846 932",   "42P02 1008",  "42P03 955",
+        "42000 900",   "53100 1653",  "53200 4031",  "53300 18",    "55P03 54",    "57014 1013",  "57P01 3113",  "57P03 1033",
+        "58030 1115",  "P0001 20000", "P0002 1403",  "P0003 1422",  "XX000 600",   "XX001 1578",  "XX002 1578",  "ZZ000 600"};
+    for (const std::string_view c : cases) {
+        const std::string words(c.substr(std::min(c.find(' ', 6), c.size())));
+        EXPECT_EQ(Run("do $$ begin raise exception using errcode = '" + std::string(c.substr(0, 5)) + "', message = 'm" + words +
+                      "'; end $$"), std::atoi(c.data() + 6)) << c;
+    }
+    EXPECT_FALSE(connection_->Broken());
+}
+
+// In the binary form, and in texts where another column has no binary form here.
+TEST_F(Postgres, ValuesAtTheirLimits) {
+    const struct { const char* expression; const char* read; } cases[] = {
+        {"'NaN'::numeric", "error 1722"}, {"'infinity'::numeric", "error 1426"}, {"'-infinity'::numeric", "error 1426"},
+        {"-5::numeric", "-5"}, {"1e125::numeric", "decimal 1E+125"}, {"1e126::numeric", "error 1426"},
+        {"1e-140::numeric", "decimal 0"}, {"'infinity'::real", "real inf"}, {"'(70000,4)'::tid", "row 00000000000111700004"},
+        {"'infinity'::timestamp", "error 1841"}, {"'-infinity'::date", "error 1841"}, {"'infinity'::timestamptz", "error 1841"},
+        {"'9999-12-31'::date", "time 9999-12-31 00:00:00"}, {"'10000-01-01'::date", "error 1841"},
+        {"'4713-12-31 BC'::timestamp", "error 1841"}, {"'4712-01-01 BC'::timestamp", "time -4712-01-01 00:00:00"},
+        {"'0001-12-31 23:59:59.999999 BC'::timestamp", "time -0001-12-31 23:59:59.999999"},
+        {"'0044-03-15 12:00:00+00 BC'::timestamptz", "time -0044-03-15 12:00:00 +00:00"}};
+    for (const auto& c : cases) {
+        const std::string read = c.read, select = std::string("select ") + c.expression;
+        const bool fails = read.starts_with("error");
+        EXPECT_EQ(Query(select), fails ? read : read + ';') << select;
+        EXPECT_EQ(Query(select + ", '::1'::inet"), fails ? read : read + ",::1;") << select;
+    }
+    for (const char* number : {"0.0012", "0.00012", "-0.05", "1.5", "12.34", "100.05", "123456789.123456789", "1000000",
+                               "12345678901234567890123456789012345678.91", "-0.5"})
+        EXPECT_EQ(Query("select %1::text", {Decimal(Number(number))}), std::string(number) + ';') << "of the scale that it has";
+    OCINumber infinite{};
+    number::SetInfinity(false, &infinite);
+    EXPECT_EQ(Query("select %1::text", {Decimal(infinite)}), "Infinity;");
+    number::SetInfinity(true, &infinite);
+    EXPECT_EQ(Query("select %1::text", {Decimal(infinite)}), "-Infinity;");
+    infinite.OCINumberPart[0] = 22;
+    EXPECT_EQ(Query("select %1::text", {Decimal(infinite)}), "error 1722");
+
+    const date::DateTime leap{.year = 2024, .month = 2, .day = 29, .hour = 12};
+    date::DateTime zoned = leap, ides = leap, none = leap;
+    zoned.has_zone = true;
+    zoned.zone_minutes = 330;
+    ides.year = -44, ides.month = 3;
+    none.day = 30;
+    const struct { const char* expression; date::DateTime value; const char* text; } moments[] = {
+        {"%1::timestamp::text", ides, "0044-03-29 12:00:00 BC;"}, {"%1::timestamp::text", none, "error 1839"},
+        {"(%1::timestamptz at time zone 'UTC')::text", zoned, "2024-02-29 06:30:00;"},
+        {"%1", leap, "time 2024-02-29 12:00:00;"}, {"%1 is null", leap, "0;"},
+        {"pg_typeof(%1)::text", leap, "timestamp without time zone;"}};
+    for (const auto& c : moments) EXPECT_EQ(Query(std::string("select ") + c.expression, {Moment(c.value)}), c.text) << c.expression;
+    const struct { date::DateTime value; bool is_date; const char* read; std::uint16_t type; } literals[] = {
+        {leap, true, "time 2024-02-29 12:00:00;", SQLT_DAT}, {leap, false, "time 2024-02-29 12:00:00;", SQLT_TIMESTAMP},
+        {zoned, false, "time 2024-02-29 06:30:00 +00:00;", SQLT_TIMESTAMP_TZ}};
+    for (const auto& c : literals) {
+        const auto query = Opened("select " + database_->GetDialect().date_literal(c.value, c.is_date));
+        EXPECT_EQ(query->Columns()[0].type, c.type);
+        EXPECT_EQ(Rest(*query), c.read);
+    }
+}
+
+TEST_F(Postgres, SavepointsAreKnownByTheirNames) {
+    MustCommit("create table t(n integer)");
+    const struct { const char* sql; int number; const char* rows; } cases[] = {
+        {"SAVEPOINT Here", 0, ""}, {"insert into t values(1)", 0, "1;"}, {"/* x */ savepoint \"Here\" ; -- x", 0, "1;"},
+        {"insert into t values(2)", 0, "1;2;"}, {"savepoint a b", 900, "1;2;"}, {"savepoint a; select 1", 933, "1;2;"},
+        {"savepoint \"\"", 900, "1;2;"}, {"Rollback Work To \"Here\"", 0, "1;"}, {"rollback transaction to savepoint HERE", 0, ""},
+        {"rollback to \"Here\"", 1086, ""}, {"savepoint \"a\"\"b\"", 0, ""}, {"insert into t values(3)", 0, "3;"},
+        {"savepoint a$b", 0, "3;"}, {"insert into t values(4)", 0, "3;4;"}, {"rollback to a$B", 0, "3;"},
+        {"release savepoint \"a\"\"b\"", 0, "3;"}, {"rollback to a$b", 1086, "3;"}, {"release here", 0, "3;"},
+        {"rollback to here", 1086, "3;"}};
+    for (const auto& c : cases) {
+        EXPECT_EQ(Run(c.sql), c.number) << c.sql;
+        EXPECT_EQ(Query("select n from t order by n"), c.rows) << c.sql;
+    }
+    engine::ObjectDescription object;
+    std::string schema = "\xFF";
+    EXPECT_EQ(Answer(connection_->Describe("\xFF", engine::ObjectKind::any, object)), 911);
+    EXPECT_EQ(Answer(connection_->UseSchema(schema)), 911);
+    EXPECT_EQ(Query("select n from t"), "3;") << "the transaction goes on";
+}
+
+// What is found at the end undoes the transaction.
+TEST_F(Postgres, DeferredConstraintsFailAtTheEnd) {
+    MustCommit("create table t(n integer primary key deferrable initially deferred)");
+    bool read_only = false;
+    for (const bool prepares : {false, true}) {
+        MustRun("insert into t values(1), (1)");
+        EXPECT_EQ(Answer(prepares ? connection_->Prepare({.format = 1}, read_only) : connection_->Commit()), prepares ? 1 : 2091);
+        EXPECT_FALSE(connection_->InTransaction());
+        EXPECT_EQ(Query("select n from t"), "");
+    }
+}
+
+// Of placeholders alone, in forms that the server's arrays have. A trigger counts the statements that come.
+TEST_F(Postgres, LongArraysAreOneStatement) {
+    MustCommit("create table t(n numeric, v text, r tid, m timestamp)", "create table s(n integer)",
+               "create function f() returns trigger language plpgsql as $$ begin insert into s values(1); return null; end $$",
+               "create trigger g after insert on t execute function f()");
+    const engine::RowId row{};
+    const struct { const char* sql; std::vector<Datum> values; const char* statements; } cases[] = {
+        {"insert into t(n, v) values(%1, %2)", {Integer(1), Text("x")}, "1;"},
+        {"INSERT INTO T(M) VALUES ( %1 )", {Moment({.year = 2024, .month = 1, .day = 1})}, "1;"},
+        {"insert into t(m) values(%1)", {Text("01-JAN-24")}, "20;"},    {"insert into t(r) values(%1)", {Row(row)}, "20;"},
+        {"insert into t(n) values(%1)", {Null()}, "20;"},               {"insert into t values(default)", {}, "20;"},
+        {"insert into t(n) values(abs(%1))", {Integer(1)}, "20;"},      {"insert into t(n) select %1", {Integer(1)}, "20;"}};
+    for (const auto& c : cases) {
+        Rows rows;
+        rows.rows.assign(20, c.values);
+        engine::ArrayOutcome outcome;
+        const auto insert = Prepared(c.sql, c.values);
+        EXPECT_EQ(Answer(insert->ExecuteArray(rows, {.first = 0, .last = 20}, outcome)), 0) << c.sql;
+        EXPECT_EQ(outcome.affected, 20u) << c.sql;
+        EXPECT_EQ(Query("select count(*) from s"), c.statements) << c.sql;
+        ASSERT_EQ(Run("deallocate all"), 0);                           // the engine's own, too: they are made anew
+        EXPECT_EQ(Execute(*insert, rows, {.first = 0, .last = 20}), 0) << c.sql;
+        EXPECT_EQ(Query("select count(*) from t"), "40;") << c.sql;
+        ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    }
+    engine::ArrayOutcome outcome;
+    Rows one;
+    EXPECT_EQ(Answer(Prepared("INSERT INTO T VALUES (1)")->ExecuteArray(one, {}, outcome)), 0);
+    EXPECT_TRUE(outcome.last_row);
 }
 
 TEST_F(Postgres, MeaningsOfTheSchema) {
