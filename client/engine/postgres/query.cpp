@@ -330,9 +330,10 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
             if (batch.refusal.Number() == errors::kCancelled) stop = singly;
             if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !connection_.Broken()) continue;
         } else if (row == stop) batch.refusal = PgConnection::Stopped();
-        else if (delivers) batch = RunReturning(source, row, last, *run.returned);
+        else if (delivers) batch = RunReturning(source, row, last, stop == run.last, *run.returned);
         else batch = RunBatch(source, row, last, stop == run.last);
         if (batch.refusal.Number() == errors::kCancelled) stop = row + batch.sent;
+        stop = std::min(stop, batch.stop.value_or(stop));
         Status failure = std::move(batch.failure);
         while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction) {
             batch = RunBatch(source, row, row + batch.done, false);

@@ -55,6 +55,7 @@ private:
         std::optional<RowId> last_row;
         bool refused = false;          // the row behind those that were sent: by its source, or by a stop
         Status refusal;
+        std::optional<std::uint32_t> stop;    // the row that a stop was met at, in the whole array
     };
 
     Status PrepareTyped(std::uint32_t& error_offset);
@@ -85,9 +86,9 @@ private:
     Batch TryWhole(RowSource& source, std::uint32_t first, std::uint32_t last) noexcept;
     bool MakeWhole();
     void ReadBatch(Batch& batch) noexcept;
-    Batch RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, RowSink& sink);
-    PgConnection::Guard SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, Batch& batch);
-    Status ReadReturning(PgConnection::Guard guard, Batch& batch, std::vector<Result>& results) noexcept;
+    Batch RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, RowSink& sink);
+    PgConnection::Guard SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, Batch& batch);
+    Status ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Result>& results) noexcept;
     Status UndoRows(std::uint32_t row, const Batch& batch) noexcept;
     Status ReleaseRows(PgConnection::Guard guard, const Batch& batch) noexcept;
     Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);

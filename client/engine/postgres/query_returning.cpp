@@ -21,13 +21,17 @@ struct RowCommand {
 
 }  // namespace
 
-PgConnection::Guard PgQuery::SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, Batch& batch) {
+PgConnection::Guard PgQuery::SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds,
+                                           Batch& batch) {
     Wire& server = connection_.Server();
     PgConnection::Guard guard = PgConnection::Guard::none;
     std::size_t bytes = 0;
     for (std::uint32_t row = first; row < last && bytes < kMostBytes; ++row) {
         batch.refusal = Load(source, row);
-        if (batch.refusal.Ok() && server.Asked()) batch.refusal = PgConnection::Stopped();
+        if (batch.refusal.Ok() && heeds && server.Asked()) {
+            batch.refusal = PgConnection::Stopped();
+            batch.stop = row;
+        }
         batch.refused = !batch.refusal.Ok();
         if (batch.refused) break;
         if (batch.sent == 0) guard = connection_.SendGuard(true);
@@ -41,9 +45,9 @@ PgConnection::Guard PgQuery::SendReturning(RowSource& source, std::uint32_t firs
 }
 
 // The failure is of the row behind those that are done.
-Status PgQuery::ReadReturning(PgConnection::Guard guard, Batch& batch, std::vector<Result>& results) noexcept {
+Status PgQuery::ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Result>& results) noexcept {
     Wire& server = connection_.Server();
-    const Wire::Heeding heeding(server, !batch.refused);
+    const Wire::Heeding heeding(server, heeds && !batch.refused);
     Status failure = connection_.PassGuard(guard);
     while (failure.Ok() && batch.done < batch.sent) {
         if (batch.done > 0) failure = server.Pass(1);
@@ -76,13 +80,13 @@ Status PgQuery::ReleaseRows(PgConnection::Guard guard, const Batch& batch) noexc
 }
 
 // What fails is answered as the refusal of the row behind those that are done.
-PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, RowSink& sink) {
+PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, RowSink& sink) {
     Batch batch;
     std::vector<Result> results(std::min(last - first, kMostRows));
     const PgConnection::Guard guard =
-        SendReturning(source, first, first + static_cast<std::uint32_t>(results.size()), batch);
+        SendReturning(source, first, first + static_cast<std::uint32_t>(results.size()), heeds, batch);
     if (batch.sent == 0) return batch;
-    Status failure = ReadReturning(guard, batch, results);
+    Status failure = ReadReturning(guard, heeds, batch, results);
     connection_.Note();    // that a transaction has begun
     std::uint32_t kept = batch.done;
     Status ended = UndoRows(kept, batch);

@@ -381,6 +381,8 @@ TEST_P(SharedContract, LockedRowsAnswerAfterAWhile) {
 TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
     ASSERT_EQ(Run("create table t(n integer)"), 0);
     engine::Xid xid{.format = -7, .global_length = 64, .branch_length = 64, .data = {'x', '\0', '\xFF'}};
+    xid.data[63] = '\xA7', xid.data[125] = '\x5B', xid.data[127] = '\xFF';
+    const char* const others[] = {"other", "kelp.1.QQ", "kelp.x.QQ.QQ", "kelp.1.Q*.QQ"};    // whose names are like ours
     bool read_only = true;
     std::vector<engine::Xid> prepared;
     EXPECT_EQ(database_->GetCapabilities().lobs, connection_->Lobs() != nullptr);
@@ -406,12 +408,18 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
         EXPECT_EQ(Answer(other->KeepsPrepared({.format = 1}, kept[2])), 0);
         EXPECT_TRUE(kept[0] && kept[1] && !kept[2]);
         prepared.clear();
-        ASSERT_EQ(Answer(other->Recover(prepared)), 0);
+        for (const std::string name : others) server_->RunHere("begin; select pg_current_xact_id(); prepare transaction '" + name + "'");
+        EXPECT_EQ(Answer(other->Recover(prepared)), 0);
+        for (const std::string name : others) server_->RunHere("rollback prepared '" + name + "'");
         EXPECT_EQ(prepared, std::vector{xid});
+        ASSERT_EQ(Answer(other->Begin(TransactionMode::read_write)), 0);
+        EXPECT_EQ(Answer(other->CommitPrepared(xid)), 24776);
+        ASSERT_EQ(Answer(other->Rollback()), 0);
         EXPECT_EQ(Answer(commits ? other->CommitPrepared(xid) : other->RollbackPrepared(xid)), 0);
         EXPECT_EQ(Answer(commits ? other->CommitPrepared(xid) : other->RollbackPrepared(xid)), 24756);
         EXPECT_EQ(All(), "1;");
-        xid.branch_length = 0;
+        xid.branch_length = 62;
+        xid.data[127] = 0;
         ASSERT_EQ(Run("insert into t values(2)"), 0);
     }
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
@@ -608,13 +616,18 @@ TEST_P(Contract, RequestStopsAnArrayThatTriesAllRows) {
             return {};
         }
     } rows(*stop_);
-    engine::ArrayOutcome outcome;
-    const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
-    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 0, .last = 9, .all_rows = true}, outcome).Ok());
-    EXPECT_TRUE(stop_->Take());
-    EXPECT_EQ(outcome.executed, 1u);
-    EXPECT_EQ(Failures(outcome), "0:1 2:1013 ");
-    EXPECT_EQ(All(), "0;1;") << "rows before it stay done";
+    Written written;
+    for (const bool returns : {false, true}) {
+        engine::ArrayOutcome outcome;
+        const auto insert = Prepared(returns ? "insert into t values(%1) returning n" : "insert into t values(%1)", std::vector{Integer(1)});
+        const engine::ArrayRun run{.first = 0, .last = 9, .all_rows = true, .returned = returns ? &written : nullptr};
+        ASSERT_TRUE(insert->ExecuteArray(rows, run, outcome).Ok());
+        EXPECT_TRUE(stop_->Take());
+        EXPECT_EQ(outcome.executed, 1u);
+        EXPECT_EQ(Failures(outcome), "0:1 2:1013 ");
+        EXPECT_EQ(All(), "0;1;") << "rows before it stay done";
+        MustRun("delete from t where n = 1");
+    }
 }
 
 TEST_P(Contract, WhatEndsOrUndoesLooksAtNoRequest) {
@@ -729,7 +742,11 @@ TEST_P(Contract, PasswordChangeIsForGood) {
     MustRun("create table t(n integer)", "insert into t values(1)");
     EXPECT_EQ(Answer(connection_->ChangePassword(owner_, "secret", "new")), 24754) << "a rollback would undo it";
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    std::unique_ptr<engine::Connection> another;
+    EXPECT_EQ(Answer(connection_->Another(stop_, another)), GetParam().shared ? 0 : 1022);
     EXPECT_EQ(Answer(connection_->ChangePassword(owner_, "secret", "new")), 0);
+    EXPECT_EQ(Answer(connection_->Another(stop_, another)), GetParam().shared ? 0 : 1022) << "with the new one";
+    another.reset();
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
     connection_.reset();
     EXPECT_EQ(LogOn(owner_, "secret"), 1017);

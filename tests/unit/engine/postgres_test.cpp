@@ -1,9 +1,11 @@
 // What the PostgreSQL engine does in its own way: servers that cannot be reached or go away, deadlocks, cursors, notices,
 // what the server says as published numbers.
 #include <sys/socket.h>
+#include <sys/time.h>
 #include <sys/un.h>
 
 #include <chrono>
+#include <csignal>
 #include <thread>
 
 #include "engine/engine_fixture.h"
@@ -40,6 +42,8 @@ TEST_F(Postgres, ServerThatCannotBeReached) {
         {"postgresql://no.such.host.invalid/x", 12154},
         {"postgresql://x:y:z/", 12560},
         {server_->Url().replace(server_->Url().find("/t"), 2, "/nowhere"), 12514}};
+    EXPECT_EQ(LogOn("\"\"", "x"), 1017) << "no name is nobody's";
+    EXPECT_EQ(LogOn("\"" + server_->Owner() + "\"", "secret"), 0);
     for (const auto& c : cases) EXPECT_EQ(Answer(engine::Open(c.url, none)), c.number) << c.url;
 
     // Somebody listens and says nothing.
@@ -82,15 +86,18 @@ TEST_F(Postgres, ServerThatGoesAway) {
     ASSERT_EQ(Run("insert into t select generate_series(1, 3000)"), 0);
     ASSERT_EQ(Answer(connection_->Commit()), 0);
     engine::ArrayOutcome outcome;
-    Rows one{{Integer(1)}};
+    Rows one{{Integer(1)}}, many;
+    many.rows.assign(20, {Integer(1)});
     Written rows;
     bool flag = false;
     std::uint32_t offset = 0;
-    std::unique_ptr<engine::Query> query, insert, made;
+    std::unique_ptr<engine::Query> query, insert, returning, made;
     const std::pair<const char*, std::function<Status()>> calls[] = {
         {"ping", [&] { return connection_->Ping(); }},
         {"compile", [&] { return connection_->Compile({"select 1", Effect::reads, {}}, made, offset); }},
         {"execute", [&] { return insert->ExecuteArray(one, {}, outcome); }},
+        {"array", [&] { return insert->ExecuteArray(many, {.first = 0, .last = 20}, outcome); }},
+        {"array that returns", [&] { return returning->ExecuteArray(many, {0, 20, false, &rows}, outcome); }},
         {"open", [&] { return query->Open(one, {}); }},
         {"begin", [&] { return connection_->Begin(TransactionMode::serializable); }},
         {"mark", [&] { return connection_->SetMark(); }},
@@ -99,13 +106,17 @@ TEST_F(Postgres, ServerThatGoesAway) {
         {"prepare", [&] { return connection_->Prepare({.format = 1}, flag); }}};
     for (const auto& [name, call] : calls) {
         insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
+        returning = Prepared("insert into t values(%1) returning n", std::vector{Integer(1)});
+        ASSERT_EQ(Execute(*insert, many, {.first = 0, .last = 20}), 0);
+        ASSERT_EQ(Answer(connection_->Rollback()), 0);
         query = Opened("select n from t");
         const bool in_transaction = name[0] == 'c' || name[0] == 'r' || name[0] == 'p';
         if (in_transaction) { ASSERT_EQ(Run("delete from t where n = 1"), 0); }
         Kill();
         const Status status = call();
         const int number = Answer(status);
-        EXPECT_EQ(number, 3113) << name << ": " << status.Detail();
+        EXPECT_EQ(number, 3113) << name;
+        EXPECT_TRUE(status.Detail().starts_with("terminating connection due to administrator command")) << name << ": " << status.Detail();
         EXPECT_EQ(Answer(call()), 3114) << name;
         query->Close();
         EXPECT_EQ(Answer(query->Fetch(rows, 1, flag)), 3114) << name;
@@ -114,9 +125,44 @@ TEST_F(Postgres, ServerThatGoesAway) {
         EXPECT_FALSE(connection_->InTransaction()) << name;
         query.reset();
         insert.reset();
+        returning.reset();
         connection_ = Connect();
         EXPECT_EQ(Query("select count(*) from t"), "3000;") << name;
     }
+}
+
+// What fails while rows are read ahead is told where they are fetched; what is closed early is undone only when it reads.
+TEST_F(Postgres, RowsThatAreReadAheadOrLeft) {
+    const auto query = Opened("select * from (values (1), (2), ('NaN'::numeric), (4)) v");
+    EXPECT_EQ(Fetched(*query, 1), "1;");
+    EXPECT_EQ(Query("select 7"), "7;");
+    EXPECT_EQ(Rest(*query), "2;error 1722");
+    MustCommit("create table t(n integer, v text)");
+    Rows none;
+    const auto insert = Prepared("with r as (insert into t select n, repeat('x', 9000) from generate_series(1, 3000) n returning *) "
+                                 "select n, v || '' from r");
+    ASSERT_EQ(Answer(insert->Open(none, {})), 0);
+    insert->Close();
+    EXPECT_EQ(Query("select count(*) from t"), "3000;");
+    std::uint64_t rows = 0;
+    Written row;
+    bool found = false;
+    EXPECT_EQ(Answer(Opened("select 1")->Count(rows)), 1002);
+    EXPECT_EQ(Answer(Opened("select 1")->Scroll(1, row, found)), 1002);
+}
+
+// Signals end waits, not calls.
+TEST_F(Postgres, SignalsMeanNothing) {
+    struct sigaction before, counts{};
+    counts.sa_handler = [](int) {};
+    sigaction(SIGALRM, &counts, &before);
+    const itimerval often{.it_interval = {0, 20000}, .it_value = {0, 20000}}, never{};
+    setitimer(ITIMER_REAL, &often, nullptr);
+    EXPECT_EQ(Query("select 1 from pg_sleep(0.2)"), "1;");
+    const auto other = Connect();
+    EXPECT_EQ(Query(*other, "select 1 from pg_sleep(0.1)"), "1;");
+    setitimer(ITIMER_REAL, &never, nullptr);
+    sigaction(SIGALRM, &before, nullptr);
 }
 
 TEST_F(Postgres, DeadlockUndoesOneStatement) {
@@ -353,6 +399,12 @@ TEST_F(Postgres, MeaningsOfTheSchema) {
         const std::string answer = Query(std::string("select ") + c.expression + " from t");
         EXPECT_EQ(answer, answer.starts_with("error") ? c.value : std::string(c.value) + ';') << c.expression;
     }
+    MustRun("create sequence s start 7 increment 3 minvalue -5 maxvalue 1000");
+    engine::ObjectDescription told;
+    ASSERT_EQ(Answer(connection_->Describe("S", engine::ObjectKind::sequence, told)), 0);
+    EXPECT_EQ(told.kind, engine::ObjectKind::sequence);
+    EXPECT_EQ((std::vector{told.sequence_start, told.sequence_step, told.sequence_least, told.sequence_most}),
+              (std::vector<std::int64_t>{7, 3, -5, 1000}));
     EXPECT_EQ(Opened("select max(d) from t")->Columns()[0].type, SQLT_DAT);
     EXPECT_EQ(Opened("select d + 1 from t")->Columns()[0].type, SQLT_DAT);
     EXPECT_EQ(Told(Opened("select '10.1.2.3'::inet as i from t")->Columns()[0]), "I type 1 size 0 precision 0 scale 0");
