@@ -314,6 +314,21 @@ TEST_F(Postgres, ValuesAtTheirLimits) {
     }
 }
 
+// Texts are quoted in other ways than elsewhere, too: of such a list large objects are copies.
+TEST_F(Postgres, ListsWithLargeObjects) {
+    MustCommit("create table l(k integer, c text)", "insert into l values(3, 'three')");
+    const struct { const char* sql; bool is_object; } cases[] = {
+        {"select c from l where k = 3;", true}, {"select c from l where k = %1 and k = %2", true},
+        {"select c from l where k = %1 and k = %2 and $$;$$ <> '--'", false}, {"select c as a$ from l", false},
+        {"select c from l as a$", false}, {"select c from l where c <> '\\'", true},
+        {"select c from l where c <> E'\\';'", false}};
+    for (const auto& c : cases) {
+        const bool has_values = std::string_view(c.sql).find('%') != std::string_view::npos;
+        const std::string read = Query(c.sql, has_values ? std::vector{Integer(3), Integer(3)} : std::vector<Datum>{});
+        EXPECT_TRUE(c.is_object ? read.starts_with("kind ") : read == "three;") << c.sql << ": " << read;
+    }
+}
+
 TEST_F(Postgres, SavepointsAreKnownByTheirNames) {
     MustCommit("create table t(n integer)");
     const struct { const char* sql; int number; const char* rows; } cases[] = {
