@@ -134,7 +134,7 @@ void PgConnection::SendRelease(Guard guard) noexcept {
     wire_->Sync();
 }
 
-Status PgConnection::Settle(Guard guard, Status status) noexcept {
+Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
     const Wire::Heeding undisturbed(*wire_, false);
     Note();
     if (status.Ok() || !in_transaction_) return guard == Guard::savepoint && status.Failed() ? RolledBack(status) : status;
@@ -143,7 +143,7 @@ Status PgConnection::Settle(Guard guard, Status status) noexcept {
         wire_->Send(kDropGuard);
         wire_->Sync();
         const Status undone = wire_->Drain();
-        SomethingUndone();
+        if (ran) SomethingUndone();
         Note();
         return undone.Ok() ? status : Lose(status);
     }

@@ -95,8 +95,8 @@ public:
     // Sends what stands behind it and closes the batch.
     void SendRelease(Guard guard) noexcept;
     // Once the batch is read: goes back to where the guard stood if it has failed, and tells whether the transaction was
-    // lost with it.
-    Status Settle(Guard guard, Status status) noexcept;
+    // lost with it. `ran`: the statement did more than to be prepared, so that there may be something to undo.
+    Status Settle(Guard guard, Status status, bool ran = true) noexcept;
     // Ends the savepoint of a statement whose batch ended before it.
     Status DropGuard() noexcept;
 

@@ -183,7 +183,7 @@ Status PgQuery::SendPrepared(const std::string& name, const std::string& text, c
         } else description = std::move(result);
     }
     Status rest = server.Drain();
-    return connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+    return connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status), false);
 }
 
 // Throws before anything is changed, or the query is none.

@@ -97,7 +97,7 @@ bool PgQuery::MakeWhole() {
     connection_.SendRelease(guard);
     Status status = connection_.PassGuard(guard);
     Status rest = server.Drain();
-    if (!connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status)).Ok()) return false;
+    if (!connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status), false).Ok()) return false;
     whole_name_ = std::move(name);
     whole_ = Whole::ready;
     return true;
