@@ -90,6 +90,15 @@ TEST_F(Lobs, Utf16IsConvertedBothWays) {
     EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF0\x9F\x98\x80");
     EXPECT_EQ(Read(lob, 2, 2, 6, 1000), "2:" + data.substr(2));
     EXPECT_EQ(Read(lob, 1, 1, 10, 9999), "!24329");
+    const struct { ub4 amount; ub2 set; std::string data; const char* kept; } counted[] = {
+        {2, 1000, data, "2:a\xC3\xA4"}, {2, 1000, data.substr(4) + data, "2:\xF0\x9F\x98\x80" "a"}, {9, 1000, data, "!22921"},
+        {3, 1000, data.substr(0, 5), "2:a\xC3\xA4"}, {2, 31, "\xE4" "bc", "2:\xC3\xA4" "b"}};
+    for (const auto& c : counted) {
+        Temporary(other);
+        const sb4 code = Code(OCILobWrite(svc, err, other, &(amount = c.amount), 1, const_cast<char*>(c.data.data()), Size(c.data),
+                                          OCI_ONE_PIECE, nullptr, nullptr, c.set, 0));
+        EXPECT_EQ(code == 0 ? Read(other) : "!" + std::to_string(code), c.kept);
+    }
     for (const ub2 set : {1000, 2000}) {    // torn within the pair
         std::string ordered = data;
         for (std::size_t at = 0; set == 2000 && at < 8; at += 2) std::swap(ordered[at], ordered[at + 1]);
@@ -126,6 +135,13 @@ TEST_F(Lobs, PiecesGoByRepeatedCalls) {
     EXPECT_EQ(Read(lob, 3, 1, 2), "more 2:ab");
     EXPECT_EQ(Read(lob, 3, 1, 2), "2:\xC3\xA4");
     EXPECT_EQ(Read(lob, 6, 3, 1), "!24809");
+    EXPECT_EQ(Read(lob, 3, 1, 2), "more 2:ab");
+    EXPECT_EQ(OCIBreak(svc, err), OCI_SUCCESS);
+    EXPECT_EQ(Read(lob, 3, 1, 2), "!1013");
+    EXPECT_EQ(Write(lob, 6, "x", OCI_FIRST_PIECE, &(amount = 0)), OCI_NEED_DATA);
+    EXPECT_EQ(OCIBreak(svc, err), OCI_SUCCESS);
+    EXPECT_EQ(Write(lob, 1, "y", OCI_LAST_PIECE, &amount), 1013);
+    EXPECT_EQ(LengthOf(lob), 6u);
 }
 
 sb4 Takes(dvoid* context, const dvoid* data, ub4 length, ub1 piece) {
@@ -199,6 +215,26 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     EXPECT_EQ(Answer(OCILobWriteAppend(svc, err, other, &(amount = 0), elsewhere.data(), 1, OCI_ONE_PIECE, nullptr, nullptr,
                                        0, 0)), 0);
     EXPECT_EQ(Read(other), "8:\xC3\xA4xyabc\xC3\xA4" "a");
+    for (const ub4 length : {4u, 0u}) {    // room of the library's own
+        Temporary(other);
+        EXPECT_EQ(Answer(OCILobWrite(svc, err, other, &(amount = 0), 1, nullptr, length, OCI_FIRST_PIECE, &(pieces = {"abcdef"}), Gives, 0, 0)), 0);
+        EXPECT_EQ(Read(other), length == 4 ? "4:abcd" : "6:abcdef");
+    }
+    const auto asks = [](dvoid* context, const dvoid*, ub4, ub1) -> sb4 {
+        auto& self = *static_cast<decltype(this)>(context);
+        ub4 length = 0;
+        EXPECT_EQ(self.Answer(OCILobGetLength(self.svc, self.err, self.lob, &length)), 24820);
+        return OCI_CONTINUE;
+    };
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 4, this, asks, 0, 0)), 0);
+    const auto leaves = [](dvoid* context, dvoid*, ub4* length, ub1* piece) -> sb4 {
+        auto& self = *static_cast<decltype(this)>(context);
+        EXPECT_EQ(OCILogoff(self.svc, self.err), OCI_SUCCESS);
+        *length = 1, *piece = OCI_LAST_PIECE;
+        return OCI_CONTINUE;
+    };
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 4, OCI_FIRST_PIECE, this, leaves, 0, 0)), 3114);
+    ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
 }
 
 TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
@@ -236,6 +272,7 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
     EXPECT_EQ(LengthOf(lob), 100000u);
     MustRun("create table n(n nclob)", "insert into n values('x')");
     Fetch(other, "select n from n", SQLT_DBCLOB);
+    EXPECT_EQ(Answer(OCILobAppend(svc, err, lob, other)), 24806);
     const struct { OCILobLocator* of; ub1 form; ub2 set; } forms[] = {
         {lob, SQLCS_IMPLICIT, 873}, {binary, 0, 0}, {other, SQLCS_NCHAR, 2000}};
     for (const auto& c : forms) {
@@ -327,6 +364,9 @@ TEST_F(Lobs, OpeningIsPerTransaction) {
     EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READONLY)), 0);
     EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 22293);
     EXPECT_EQ(Write(lob, 1, "x"), 22294);
+    EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 0);
+    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 0);
+    EXPECT_EQ(Write(lob, 1, "x"), 0);
     boolean open = FALSE;
     EXPECT_EQ(Answer(OCILobIsOpen(svc, err, lob, &open)), 0);
     EXPECT_EQ(open, TRUE);
@@ -338,6 +378,7 @@ TEST_F(Lobs, OpeningIsPerTransaction) {
 TEST_F(Lobs, BufferedWritesWait) {
     Fetch(lob);
     EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_FREE)), 22276);
+    EXPECT_EQ(Answer(OCILobDisableBuffering(svc, err, lob)), 22276);
     EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, lob)), 0);
     Fetch(other);
     EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, other)), 22277);
@@ -378,6 +419,8 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     EXPECT_EQ(Answer(OCILobFreeTemporary(svc, err, lob)), 22275);
     Fetch(lob);
     EXPECT_EQ(Answer(OCILobFreeTemporary(svc, err, lob)), 22275);
+    EXPECT_EQ(Answer(OCILobCreateTemporary(svc, err, other, 9999, 0, OCI_TEMP_CLOB, TRUE, OCI_DURATION_SESSION)), 24329);
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &length, 1, room, 9, nullptr, nullptr, 0, 3)), 24815);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
     EXPECT_EQ(Answer(OCILobErase(svc, err, lob, nullptr, 1)), 21560);
     EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, nullptr, nullptr, 1, room, 9, 0, nullptr, nullptr, 0, 0)), 21560);

@@ -151,6 +151,42 @@ TEST_F(LongValues, ComeBackWholeFromEachKindOfTable) {
     }
 }
 
+// Text of a terminated type ends at its zero, in whatever piece; a character may be torn between two, not at the end.
+TEST_F(LongValues, OfTextsThatEndAndAreConverted) {
+    const std::string text(8'500'000, 'x'), units = [&] { std::string s; for (char c : text) (s += c) += '\0'; return s; }();
+    const auto bytes = [](const char* from, std::size_t size) { return std::string(from, size); };
+    const struct { ub2 type, set; std::string first, second, third; sb4 answer; ub4 length; const char* last; } cases[] = {
+        {SQLT_STR, 0, text, bytes("y\0z", 3), "more", 0, 8500001, "y"}, {SQLT_CHR, 0, text, "y", "z", 0, 8500002, "z"},
+        {SQLT_CHR, 1000, units, bytes("y\0\x3D", 3), bytes("\xD8\0\xDE", 3) + units.substr(0, 4'000'000) + bytes("\x3D\xD8\0\xDE", 4),
+         0, 10500003, "\xF0\x9F\x98\x80"},
+        {SQLT_CHR, 1000, units, bytes("y\0\x3D", 3), bytes("\xD8", 1), 24365, 0, ""}};
+    MustRun("create table t(c clob)");
+    for (const auto& c : cases) {
+        OCIBind* bind = nullptr;
+        ASSERT_EQ(Prepare("insert into t values(:v)"), 0);
+        ASSERT_EQ(BindName(&bind, ":v", {nullptr, 0x7FFFFFFF, c.type, nullptr, nullptr, nullptr, OCI_DATA_AT_EXEC}), 0);
+        ub2 set = c.set;
+        ASSERT_TRUE(set == 0 || OCIAttrSet(bind, OCI_HTYPE_BIND, &set, 0, OCI_ATTR_CHARSET_ID, err) == OCI_SUCCESS);
+        sword rc = ExecuteCode();
+        for (const std::string* piece : {&c.first, &c.second, &c.third}) {
+            ASSERT_EQ(rc, OCI_NEED_DATA);
+            ub4 length = Size(*piece);
+            const ub1 place = piece == &c.first ? OCI_FIRST_PIECE : piece == &c.second ? OCI_NEXT_PIECE : OCI_LAST_PIECE;
+            ASSERT_EQ(Answer(OCIStmtSetPieceInfo(bind, OCI_HTYPE_BIND, err, piece->data(), &length, place, nullptr, nullptr)), 0);
+            rc = ExecuteCode();
+        }
+        EXPECT_EQ(Answer(rc), c.answer);
+        if (c.answer != 0) continue;
+        char last[5] = "";
+        ub4 length = 0, amount = 1;
+        ASSERT_EQ(Query("select c from t", {Locator(lob, SQLT_CLOB)}) + Answer(OCILobGetLength(svc, err, lob, &length)), 0);
+        EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &amount, length, last, 4, nullptr, nullptr, 0, 0)), 0);
+        EXPECT_EQ(length, c.length);
+        EXPECT_STREQ(last, c.last);
+        MustRun("delete from t");
+    }
+}
+
 // A value that changes while its pieces are taken is not made up of old and new ones.
 TEST_F(LongValues, DoNotChangeBetweenPieces) {
     MustRun("create table t(k number, c blob)", "insert into t values(1, zeroblob(20000000))", "insert into t values(2, null)");

@@ -83,6 +83,7 @@ TEST(SqlText, KindOfStatement) {
         {"rollback to savepoint a", StatementType::unknown, sql::Run::savepoint, 55},
         {"savepoint a", StatementType::unknown, sql::Run::savepoint, 56},
         {"explain select 1", StatementType::unknown, sql::Run::other, 27},
+        {"explain update t set a = 1", StatementType::unknown, sql::Run::other, 27},
         {"begin exclusive", StatementType::begin, sql::Run::begin, 34},
         {"explain plan for select 1", StatementType::unknown, sql::Run::other, 27},
     };
@@ -148,7 +149,7 @@ TEST(SqlText, WhatTheTextTellsToBeWrong) {
         {"begin open :c for select 1 end;", 6550, 31}, {"begin if x then null; end if; end;", 6550, 6},
         {"begin open :c for ; end;", 6550, 6}, {"begin select 1 from t; end;", 6550, 6},
         {"begin null; end; select 1", 6550, 17}, {"begin null;", 6550, 11},
-        {"declare x number; begin null; end;", 6550, 0},
+        {"declare x number; begin null; end;", 6550, 0}, {"begin end;", 6550, 0}, {"begin explain select 1; end;", 6550, 6},
     };
     for (const auto& c : cases) {
         const sql::StatementText statement = sql::Scan(c.text);
@@ -182,6 +183,9 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"select cast(a as char(9 char)), cast(a as char(9 byte)) from t",
          "select to_char_c(a , 9), to_char(a , 9) from t"},
         {"alter table number add number number", "alter table number add number numeric"},
+        {"alter table t alter column number type number(5)", "alter table t alter column number type numeric(5)"},
+        {"create trigger g after insert on t begin update l set a = :new.a; end",
+         "create trigger g after insert on t begin update l set a = :new.a; end"},
         {"select cast(cast(:1 as decfloat(34)) as varchar2(9)), number, count(*) from t",
          "select cast(cast(?1 as numeric(34)) as varchar(9)), number, count(*) from t"},
         {"(select * from t)", "(select * from t)"},

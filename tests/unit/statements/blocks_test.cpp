@@ -125,6 +125,15 @@ TEST_F(Blocks, TablesAtTheirLimits) {
     ASSERT_EQ(Prepare("begin select a, a into :1, :2 from t order by a; end;"), 0);
     ASSERT_EQ(Bind(1, Int(wide), OCI_DEFAULT, 4, &(current = 0)) + Bind(2, Int(plain)), 0);
     EXPECT_EQ(Execute(), 1414);
+    ub4 shorter = 2;
+    current = 3;
+    ASSERT_EQ(Prepare("begin insert into t values(:1 + :2); end;"), 0);
+    ASSERT_EQ(Bind(1, Int(in), OCI_DEFAULT, 8, &current) + Bind(2, Int(in), OCI_DEFAULT, 8, &shorter), 0);
+    EXPECT_EQ(Execute(), 6502) << "tables of two lengths";
+    ASSERT_EQ(Prepare("begin update t set a = a + 10 where a = :1 returning a into :2; end;"), 0);
+    ASSERT_EQ(Bind(1, Int(in), OCI_DEFAULT, 8, &current) + Bind(2, Int(plain)), 0);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(plain, 13) << "of the last element";
     // From one table into another that is just full, and one element short.
     for (const ub4 most : {3u, 2u}) {
         sb4 got[4] = {-1, -1, -1, -1};

@@ -20,6 +20,7 @@ struct Callback {
     string asked;
     Place place;    // of the last call; its length lives here
     ub2 code = 9;
+    bool tells_code = true;
 
     sb4 Ask(ub4 iteration, ub4 index, ub1 piece) {
         asked += std::to_string(iteration) + "." + std::to_string(index) + "." + std::to_string(piece) + " ";
@@ -41,7 +42,7 @@ struct Callback {
         auto& self = *static_cast<Callback*>(context);
         const sb4 answer = self.Ask(iteration, index, *piece);
         *buffer = self.place.buffer, *length = &self.place.length, *piece = self.place.piece;
-        *indicator = self.place.indicator, *code = &self.code;
+        *indicator = self.place.indicator, *code = self.tells_code ? &self.code : nullptr;
         return answer;
     }
     static sb4 Define(dvoid* context, OCIDefine*, ub4 row, dvoid** buffer, ub4** length, ub1* piece, dvoid** indicator,
@@ -209,6 +210,14 @@ TEST_F(Dynamic, BlocksAndTables) {
     EXPECT_EQ(rows.Flush(), "p!|q!|r!|s!|");
     EXPECT_EQ(taker.Flush(), "abcabc|xx|");
     EXPECT_EQ(One("select group_concat(a, ',') from t"), "abcabc,p,q,xx,r,s");
+    count = 3, giver.next = 0;
+    EXPECT_EQ(Execute(1), 1414) << "more elements than room";
+    Taker selected(9);
+    ASSERT_EQ(Prepare("begin select a into :e from t where length(a) = 1 order by a; end;"), 0);
+    ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR), OCI_DEFAULT, 4, &(count = 0)), 0);
+    ASSERT_EQ(Answer(OCIBindDynamic(binds_[1], err, &elements, Callback::In, &selected, Callback::Out)), 0);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(selected.Flush(), "p|q|r|s|");
 }
 
 // A name that stands twice is asked for once; iterations count from the row offset.
@@ -266,6 +275,14 @@ TEST_F(Dynamic, AnswersThatAreRefused) {
         ASSERT_EQ(BindTo(1, nullptr, &callback), 0);
         EXPECT_EQ(Execute(), c.out);
     }
+    const auto no_length = [](dvoid* context, OCIDefine*, ub4, dvoid** buffer, ub4** length, ub1*, dvoid**, ub2**) -> sb4 {
+        *buffer = context, *length = nullptr;
+        return OCI_CONTINUE;
+    };
+    OCIDefine* define = nullptr;
+    ASSERT_EQ(Query("select 'abc' from dual", {}, 0) + Define(&define, 1, InPieces(SQLT_CHR)), 0);
+    ASSERT_EQ(Answer(OCIDefineDynamic(define, err, room, no_length)), 0);
+    EXPECT_EQ(Fetch(), 24307);
 }
 
 // What callbacks do to what calls them. The statement itself is closed; the rest of the session is not.
@@ -363,6 +380,11 @@ TEST_F(Dynamic, CutValuesAndFailedRows) {
     EXPECT_EQ(taker.Flush(), "abc|");
     EXPECT_EQ(taker.indicator, 6);
     EXPECT_EQ(taker.code, 1406);
+    ASSERT_EQ(Prepare("insert into t values('abcdef', null) returning a into :1"), 0);
+    ASSERT_EQ(BindTo(1, nullptr, &taker), 0);
+    EXPECT_EQ(Execute(), 24345);
+    taker.tells_code = false;
+    EXPECT_EQ(Execute(), 1406);
     Taker returned(9);
     char in[2][5] = {"long", "s"}, narrow[2][2] = {};
     ASSERT_EQ(Prepare("insert into t values('a', :1) returning a, b into :2, :3"), 0);

@@ -138,6 +138,8 @@ TEST_F(Fetching, ExactFetch) {
         EXPECT_EQ(State(), 3u) << c.rows;
         EXPECT_EQ(Fetch(), c.fetch) << c.rows;
     }
+    MustRun("update t set name = case when id = 1 then '5' else 'x' end");
+    EXPECT_EQ(Query("select to_number(name) from t where id < 3", {Int(ids_)}, 1, OCI_EXACT_FETCH), 1722) << "no row is told to be the last";
 }
 
 TEST_F(Fetching, Scrolling) {
@@ -160,6 +162,8 @@ TEST_F(Fetching, Scrolling) {
     EXPECT_EQ(Fetch(1, OCI_FETCH_ABSOLUTE, 3), 0);
     EXPECT_EQ(RowCount(), 7u);
     EXPECT_EQ(indicators_[0], -1);
+    ASSERT_EQ(Query("select id from t order by id", {Int(ids_)}, 2, OCI_STMT_SCROLLABLE_READONLY), 0);
+    EXPECT_EQ(Delivered(), "1,2") << "by the execute";
 }
 
 TEST_F(Fetching, DefinesMayBeMadeAnewAndFreed) {

@@ -199,6 +199,41 @@ TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
     EXPECT_EQ(indicator, 8);
     EXPECT_EQ(code, 1406);
     EXPECT_STREQ(other, "x");
+    char cut[2] = "";    // beside a value in pieces
+    Begin("select 'ab', 'x' from dual", {Text(cut, &indicator, nullptr, &code), InPieces(SQLT_CHR)});
+    sword rc = 0;
+    EXPECT_EQ(Piece(3, rc), "x");
+    EXPECT_EQ(Answer(rc), 24345);
+}
+
+// A scrollable query, from a position on; one that delivers fewer rows than are asked for stays on the last.
+TEST_F(PieceByPiece, RowsFromAPosition) {
+    sb4 ids[2] = {};
+    ASSERT_EQ(Query("select 'a', 1 from dual union all select 'b', 2 from dual union all select 'c', 3 from dual",
+                    {InPieces(SQLT_CHR), Int(ids)}, 0, OCI_STMT_SCROLLABLE_READONLY), 0);
+    EXPECT_EQ(OCIStmtFetch2(stmt, err, 2, OCI_FETCH_ABSOLUTE, 3, OCI_DEFAULT), OCI_NEED_DATA);
+    sword rc = 0;
+    EXPECT_EQ(Piece(3, rc), "c");
+    EXPECT_EQ(rc, OCI_NO_DATA);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_CURRENT_POSITION), 3u);
+    EXPECT_EQ(OCIStmtFetch2(stmt, err, 1, OCI_FETCH_FIRST, 0, OCI_DEFAULT), OCI_NEED_DATA);
+    EXPECT_EQ(ids[0] * 10 + ids[1], 10) << "no row more";
+}
+
+TEST_F(PieceByPiece, AQueryTakesItsValuesInPieces) {
+    char got[9] = "";
+    ASSERT_EQ(Ready("select :1 || 'c' from dual union all select 'd' from dual", {InPieces(SQLT_CHR)}) + Define(1, Text(got)), 0);
+    for (const ub4 mode : {OCI_EXACT_FETCH, OCI_DEFAULT}) {
+        ASSERT_EQ(ExecuteCode(1, mode), OCI_NEED_DATA);
+        for (const ub1 piece : {OCI_FIRST_PIECE, OCI_LAST_PIECE}) {
+            ub4 length = 1;
+            ASSERT_EQ(Set(piece == OCI_FIRST_PIECE ? "a" : "b", &length, piece), 0);
+            EXPECT_EQ(Execute(1, mode), piece == OCI_FIRST_PIECE ? 3129 : mode == OCI_DEFAULT ? 0 : 1422);
+        }
+        EXPECT_STREQ(got, "abc");
+    }
+    EXPECT_EQ(Fetch(), 0);
+    EXPECT_STREQ(got, "d");
 }
 
 TEST_F(PieceByPiece, ANullWithoutAnyIndicator) {
