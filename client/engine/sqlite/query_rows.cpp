@@ -79,7 +79,14 @@ Status SqliteQuery::Ended(Status status) noexcept {
             if (!scrollable_) Close();
             return status;
         }
-        status = sink.Row(0, values_);
+        const bool came = state_ == State::stepping && !scrollable_;
+        try {
+            status = sink.Row(0, values_);
+        } catch (const std::bad_alloc&) {    // it comes again
+            if (came) state_ = State::on_row;
+            else --next_;
+            throw;
+        }
     }
     more = IsOpen();
     return status;

@@ -953,7 +953,6 @@ protected:
 TEST_P(LobContract, LockedOneIsWrittenAndSeenByTheNextStatement) {
     const Kept lob = Locked();
     EXPECT_EQ(Read(*lob, 2) + Read(*lob, 5) + Read(*lob, 99), "ree");
-    EXPECT_EQ(Plain()->Version(), 0u) << "never becomes another";
     const std::uint64_t version = lob->Version();
     EXPECT_EQ(Write(*lob, 0, "TH"), 0);                        // in place
     EXPECT_EQ(Write(*lob, 5, " and four"), 0);                 // grows
@@ -1099,7 +1098,8 @@ TEST_P(LobContract, LongOnesAreReadAndWrittenInPieces) {
     ASSERT_EQ(Run("update l set c = 'short' where k = 7"), 0);
     EXPECT_EQ(Read(*plain, 70000), GetParam().shared && !GetParam().brings_lobs ? text.substr(70000, 100) : "error 22924");
     ASSERT_EQ(Run("delete from l"), 0);
-    EXPECT_EQ(Read(*lob, 8'000'000), "error 22922");
+    EXPECT_EQ(Read(*lob, 8'000'000), GetParam().brings_lobs ? "error 22922" : "error 22924");
+    if (GetParam().brings_lobs) { EXPECT_EQ(Read(*plain, 8'000'000), "error 22922"); }
 }
 
 TEST_P(LobContract, LongOnesAreReadWhileTheirRowsCome) {
