@@ -5,6 +5,7 @@
 #include <string>
 
 #include "core/command_table.h"
+#include "core/state.h"
 #include "support/printed.h"
 #include "report/diagnostics.h"
 #include "report/trace.h"
@@ -68,6 +69,13 @@ TEST(Diagnostics, TheServerTagIsTheSameForEveryServer) {
         {"", ""}, {"one\r\n", "one\n"}, {"one\r\ntwo\r\n", "one\nttwo\r\n"}, {"one\rtwo\n", "one\rtwo\n"},
         {"[AS]" + longest, "[KELP/OKRA64]" + longest.substr(0, 1011)}};
     for (const auto& c : cases) EXPECT_EQ(NormaliseDiagnostic(c.text), c.shown) << c.text;
+    const std::u16string wide(2000, u'x');
+    std::string text;
+    application_code_page = second_code_page = 1208;
+    Utf16Mode = true;
+    EXPECT_TRUE(ReadDiagnostic(reinterpret_cast<const char*>(wide.data()), 2 * wide.size(), text));
+    Utf16Mode = false;
+    EXPECT_EQ(text, std::string(1024, 'x'));
 }
 
 TEST(WordCounts, WhatEachFormHolds) {

@@ -110,6 +110,25 @@ TEST(Values, ATextOfOneByteIsItsEnd) {
     EXPECT_EQ(element.Bytes(1), std::string(1, '\0'));
 }
 
+TEST(Values, BlanksInUtf16) {
+    Element element(SQLT_AFC, 8);
+    application_code_page = second_code_page = 1208;
+    Utf16Mode = true;
+    EXPECT_EQ(element.Assign("ab", 2), "convertToUTF16 succeeded - In length - 2, Out length - 4\n");
+    Utf16Mode = false;
+    EXPECT_EQ(element.Bytes(8), std::string("a\0b\0 \0 \0", 8));
+}
+
+// Of fewer characters than a line sets aside, of as many, and of more.
+TEST(Values, LargeRealsAreShownWhole) {
+    for (const double value : {1e247, 1e248, -1e308}) {
+        Element element(SQLT_FLT, sizeof value);
+        std::memcpy(element.data, &value, sizeof value);
+        element.indicator = 0;
+        EXPECT_EQ(element.Show(), std::to_string(value) + "\n");
+    }
+}
+
 // Lengths that the library returned, or prefixes in the data, may say more than there is.
 TEST(Values, LengthsAreNotFollowedPastTheElement) {
     const struct { int type; uint32_t size; const char* shown; } cases[] = {
@@ -160,7 +179,8 @@ TEST(Values, SevenByteDatesThatArePossible) {
         {{120, 124, 4, 31, 1, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 0, 1, 1}, "Invalid date found\n"},
         {{120, 124, 1, 1, 25, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 1, 61, 1}, "Invalid date found\n"},
         {{120, 124, 1, 1, 1, 1, 61}, "Invalid date found\n"}, {{119, 100, 2, 29, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"}};
+        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"},
+        {{100, 99, 2, 29, 1, 1, 1}, "\"-001-02-29-00:00:00\"\n"}, {{100, 96, 2, 29, 1, 1, 1}, "Invalid date found\n"}};
     for (const auto& c : cases) {
         Element element(SQLT_DAT, 7);
         std::memcpy(element.data, c.bytes, sizeof c.bytes);

@@ -53,7 +53,7 @@ TEST(CodePages, AreasOfEveryLength) {
         {1202, 943, Convert(943, 1202, "a\x82\xA0\xB1z").output},
         {1258, 1208, "xe\xEC" "e\xEC" "ae"},  // each e but the last is joined by its accent
         {1258, 1202, "xe\xEC" "ae\xEC"}, {1208, 37, "abcé"}, {1208, 819, "a中"},
-        {1208, 943, "é中é"},  // substitutes that just fit
+        {1208, 943, "é中é"}, {1208, 54936, "a\xFFz"},  // substitutes that just fit
         {1208, 1202, "a\xFFz\xE4\xB8"}, {1202, 850, Convert(1208, 1202, "aй中z").output},
     };
     for (const auto& c : cases) {
@@ -70,6 +70,7 @@ TEST(CodePages, AreasOfEveryLength) {
             EXPECT_EQ(cut.unused_input > 0, !is_whole);
         }
     }
+    EXPECT_EQ(Convert(1258, 1208, "xye\xEC", 3).output, "xy") << "all that fits before the letter with its accent";
 }
 
 TEST(CodePages, WhatCannotBeConverted) {

@@ -1,8 +1,10 @@
 // Settings: what is found, what a write changes and, above all, what it leaves alone.
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -119,8 +121,24 @@ TEST_F(Ini, AFileThatCannotBeReadIsNotReplaced) {
     std::filesystem::remove(File());
     EXPECT_TRUE(Write("s", "k", nullptr));
     EXPECT_FALSE(std::filesystem::exists(File()));
+    std::filesystem::create_directory(File() += ".new");
+    EXPECT_FALSE(Write("s", "k", "v"));
+    std::filesystem::remove(File() += ".new");
     setenv("KELPCI_HOME", (home_ / "nowhere").c_str(), 1);
     EXPECT_FALSE(Write("s", "k", "v"));
+}
+
+TEST_F(Ini, AWriteThatFindsNoRoomLeavesTheOldFile) {
+    Put("[s]\nk=1\n");
+    rlimit usual{};
+    getrlimit(RLIMIT_FSIZE, &usual);
+    const rlimit few{8, usual.rlim_max};
+    std::signal(SIGXFSZ, SIG_IGN);
+    setrlimit(RLIMIT_FSIZE, &few);
+    EXPECT_FALSE(Write("s", "k", "22"));
+    setrlimit(RLIMIT_FSIZE, &usual);
+    EXPECT_EQ(Content(), "[s]\nk=1\n");
+    EXPECT_FALSE(std::filesystem::exists(File() += ".new"));
 }
 
 TEST_F(Ini, WritersDoNotLoseEachOthersKeys) {

@@ -56,10 +56,36 @@ TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
     ASSERT_EQ(Start(0, 1, OCI_TRANS_NEW), 0);
     ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
     ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    auto* branch = Attribute<OCITrans*>(svc_[1], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
+    XID coupled{5, 2, 1, "txc"};
+    ASSERT_EQ(Answer(OCIAttrSet(branch, OCI_HTYPE_TRANS, &coupled, sizeof coupled, OCI_ATTR_XID, err_)), 0);
+    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW), 0);
+    ASSERT_EQ(Answer(OCITransDetach(svc_[1], err_, OCI_DEFAULT)), 0);
     EXPECT_EQ(Run(1, "insert into t values(2)"), 0) << "waits for the lock";
     EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
-    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24761);
-    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24756);
+    EXPECT_EQ(OCITransMultiPrepare(svc_[1], 1, &branch, &err_), OCI_ERROR);
+    EXPECT_EQ(FirstCode(err_), 24761) << "with the one whose transaction it shares";
+    EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24761);
+    EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24756);
+}
+
+TEST_F(Transactions, OfAnotherUser) {
+    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
+    ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    auto* branch = Attribute<OCITrans*>(svc_[1], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
+    ASSERT_EQ(Answer(OCILogoff(svc_[1], err_)), 0);
+    ASSERT_EQ(LogOn(&svc_[1], "bank", "ann", "secret"), 0) << "the owner from now on";
+    ASSERT_EQ(Answer(OCIAttrSet(svc_[1], OCI_HTYPE_SVCCTX, branch, 0, OCI_ATTR_TRANS, err_)), 0);
+    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24774);
+    XID xid{5, 2, 1, "txb"};
+    char info[] = "SqlNet=bank+Acc=P/ann/secret";
+    ASSERT_EQ(rmXaSwitch.xa_open_entry(info, 1, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(rmXaSwitch.xa_start_entry(&xid, 1, TMJOIN), XAER_RMERR);
+    SQLCA diagnostics{};
+    EXPECT_EQ(XaGetInfo(1, &diagnostics), XA_OK);
+    EXPECT_EQ(diagnostics.sqlcode, -24774);
+    EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 1, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 0);
 }
 
 // A session that goes without a word takes its branch with it; a result does not outlive the connection.
