@@ -55,7 +55,7 @@ TEST_F(DateCalls, ResultsAreWrittenOnSuccessOnly) {
     const OCIDate bad = Date(2023, 2, 29);
     EXPECT_EQ(Answer(OCIDateLastDay(err_, &bad, &day)), 1839);
     EXPECT_EQ(Answer(OCIDateAddDays(err_, &day, 2147483647, &day)), 1841);
-    EXPECT_EQ(Answer(OCIDateNextDay(err_, &day, Text("XYZ"), 3, &day)), 1846);
+    for (const char* name : {"XYZ", "SUNDAYS"}) EXPECT_EQ(Answer(OCIDateNextDay(err_, &day, Text(name), Length(name), &day)), 1846);
     EXPECT_EQ(day.OCIDateYYYY, 2025);
     EXPECT_EQ(Answer(OCIDateNextDay(err_, &day, Text("SUNDAY"), 6, &day)), 0);
     EXPECT_EQ(day.OCIDateMM * 100 + day.OCIDateDD, 302);
@@ -106,17 +106,19 @@ TEST_F(DateCalls, TextsInUtf16) {
 }
 
 TEST_F(DateCalls, TypesHaveTheirParts) {
-    const struct { ub4 type; const char* date; const char* time; } cases[] = {
-        {OCI_DTYPE_DATE, "2024-7-15", "1878"}, {OCI_DTYPE_TIME, "1878", "13:14:15.250000000"},
-        {OCI_DTYPE_TIME_TZ, "1878", "13:14:15.250000000"}, {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.250000000"},
-        {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.250000000"},
-        {OCI_DTYPE_TIMESTAMP_LTZ, "2024-7-15", "13:14:15.250000000"},
-        {OCI_DTYPE_INTERVAL_YM, "2024-7-15", "13:14:15.250000000"},
-    };    // the general type
+    const char *const day = "2024-7-15", *const time = "13:14:15.250000000";
+    const struct { ub4 type; const char* date; const char* time; sb4 zone; bool own_zone = false; } cases[] = {
+        {OCI_DTYPE_DATE, day, "1878", 1878}, {OCI_DTYPE_TIME, "1878", time, 1878}, {OCI_DTYPE_TIME_TZ, "1878", time, 0, true},
+        {OCI_DTYPE_TIMESTAMP, day, time, 1878}, {OCI_DTYPE_TIMESTAMP_TZ, day, time, 0, true},
+        {OCI_DTYPE_TIMESTAMP_LTZ, day, time, 0}, {OCI_DTYPE_INTERVAL_YM, day, time, 0, true},
+    };    // the last is the general type
     for (const auto& c : cases) {
         OCIDateTime* value = NewDateTime(c.type);
         const bool has_date = std::string_view(c.date) != "1878", has_time = std::string_view(c.time) != "1878";
         EXPECT_EQ(DateOf(value), has_date ? "1866" : "1878") << c.type << " unset";
+        EXPECT_EQ(TimeOf(value), has_time ? "1866" : "1878") << c.type << " unset";
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 4)), has_time ? 0 : 1878) << c.type;
+        EXPECT_EQ(DateOf(value), has_date ? "1866" : "1878") << c.type << " has a time alone";
         EXPECT_EQ(Answer(Construct(value, "+02:00", 250000000)), 0) << c.type;
         EXPECT_EQ(DateOf(value), c.date) << c.type;
         EXPECT_EQ(TimeOf(value), c.time) << c.type;
@@ -132,6 +134,9 @@ TEST_F(DateCalls, TypesHaveTheirParts) {
         EXPECT_EQ(flags, 0u) << c.type;
         EXPECT_EQ(DateOf(value), has_date ? "-44-3-15" : "1878") << c.type;
         EXPECT_EQ(TimeOf(value), has_time ? "1:2:3.4" : "1878") << c.type;
+        sb1 hour = 99, minute = 0;
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), c.zone) << c.type;
+        EXPECT_TRUE(!c.own_zone || hour == 2) << c.type << ' ' << int{hour};
     }
 }
 
@@ -144,11 +149,22 @@ TEST_F(DateCalls, AssignmentKeepsTheTypesParts) {
     ASSERT_EQ(Answer(Construct(zoned, "Asia/Kolkata", 5)), 0);
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, stamp)), 0);
     EXPECT_EQ(TimeOf(stamp), "13:14:15.5");
+    sb1 hour = 0, minute = 0;
+    sword order = 9;
+    EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, stamp, &hour, &minute)), 1878);
+    for (const char* zone : {"+05:30", "-08:00"}) {
+        OCIDateTime* local = NewDateTime(OCI_DTYPE_TIMESTAMP_LTZ);
+        ASSERT_EQ(Answer(Construct(zoned, zone, 5)), 0);
+        EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, local)), 0);
+        EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, zoned, local, &order)), 0);
+        EXPECT_EQ(order, 0) << zone << ": the same moment";
+    }
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, day)), 0);
     EXPECT_EQ(DateOf(day), "2024-7-15");
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, time)), 0);
     EXPECT_EQ(TimeOf(time), "13:14:15.5");
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, time, stamp)), 1878);
+    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, time, time)), 0);
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, zoned)), 0);
 }
 
@@ -157,8 +173,9 @@ TEST_F(DateCalls, ComparisonCrossesZones) {
     OCIDateTime* other = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
     OCIDateTime* time = NewDateTime(OCI_DTYPE_TIME);
     sword order = 9;
-    EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, india, other, &order)), 1866);
     ASSERT_EQ(Answer(Construct(india, "+05:30")), 0);
+    EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, india, other, &order)), 1866);
+    EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, other, india, &order)), 1866);
     ASSERT_EQ(Answer(Construct(time)), 0);
     const struct { const char* zone; sword order; } cases[] = {
         {"+05:30", 0}, {"Asia/Kolkata", 0}, {"UTC", -1}, {"+05:31", 1}, {"Pacific/Auckland", 1}};

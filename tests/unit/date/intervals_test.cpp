@@ -62,7 +62,7 @@ TEST_F(IntervalCalls, TextsAreReadAndWritten) {
         {false, "9 23:59:59.95", 2, 1, "+10 00:00:00.0"}, {false, "9 23:59:59.94", 1, 1, "+9 23:59:59.9"},
         {false, "999999999 23:59:59.9", 9, 0, "1873"}, {false, "-0 0:0:0.4", 2, 0, "+00 00:00:00"},
         {false, "x", 1, 0, "1867"}, {false, "1 2:x", 1, 0, "1867"},
-        {false, "1 2:3:x", 1, 0, "1867"}, {false, "1 2 3", 1, 0, "1867"}, {false, "1 -2:03", 1, 0, "1867"}, {false, "2-3", 2, 0, "1867"},
+        {false, "1 2:3:x", 1, 0, "1867"}, {false, "5", 1, 10, "30088"}, {false, "1 2 3", 1, 0, "1867"}, {false, "1 -2:03", 1, 0, "1867"}, {false, "2-3", 2, 0, "1867"},
         {false, "99999999999999999999 0", 9, 0, "1873"}};
     for (const auto& c : cases) {
         sb4 number = 0;
@@ -103,6 +103,7 @@ TEST_F(IntervalCalls, PartsHaveLimitsAndOneSign) {
     EXPECT_EQ(Answer(OCIIntervalSetYearMonth(env_, err_, 1, 2, days)), 1867);
     EXPECT_EQ(Answer(OCIIntervalSetDaySecond(env_, err_, 1, 2, 3, 4, 5, months)), 1867);
     EXPECT_EQ(Answer(OCIIntervalSetYearMonth(env_, err_, 0, 12, months)), 1843);
+    EXPECT_EQ(Answer(OCIIntervalSetYearMonth(env_, err_, 1000000000, 0, months)), 1873);
     EXPECT_EQ(Answer(OCIIntervalSetYearMonth(env_, err_, -3, -11, months)), 0);
     EXPECT_EQ(Answer(OCIIntervalGetYearMonth(env_, err_, &year, &month, months)), 0);
     EXPECT_EQ(year * 100 + month, -311);
@@ -175,7 +176,9 @@ TEST_F(IntervalCalls, SumsCarryAndCompare) {
     sword order = 0;
     EXPECT_EQ(Answer(OCIIntervalCompare(env_, err_, months, Read("1"), &order)), 1870);
     EXPECT_EQ(Answer(OCIIntervalAdd(env_, err_, months, Read("1"), months)), 1870);
-    EXPECT_EQ(OCIIntervalAssign(env_, err_, Bogus<OCIInterval>(), months), OCI_INVALID_HANDLE);
+    auto* stamp = reinterpret_cast<OCIInterval*>(NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP));
+    for (const OCIInterval* none : {Bogus<OCIInterval>(), stamp})
+        EXPECT_EQ(OCIIntervalAssign(env_, err_, none, months), OCI_INVALID_HANDLE);
     EXPECT_EQ(Answer(OCIIntervalAssign(env_, err_, months, nullptr)), 21560);
 }
 
@@ -237,6 +240,10 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
         EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, later, 2025, 1, 15)), 0);
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, later, &winter, &minute)), 0);
         EXPECT_EQ(winter, c.winter) << c.name;
+        EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, later, 2024, 10, 27)), 0);
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, later, 4, 0, 0, 0)), 0);
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, later, &winter, &minute)), 0);
+        EXPECT_EQ(winter, c.winter) << c.name << ", later that day";
         size = 5;
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneName(env_, err_, moment, name, &size)), 22059);
         EXPECT_EQ(size, 12u);

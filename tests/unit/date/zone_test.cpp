@@ -136,12 +136,14 @@ TEST(ZoneRules, AgreeWithTheCLibrary) {
 
 TEST(ZoneRules, TextsOfRules) {
     const struct { const char* text; std::int64_t moment; int offset; const char* name; } cases[] = {
-        {"UTC0", 0, 0, "UTC"}, {"LMT-0:20:59", 0, 1259, "LMT"}, {"<+0330>-3:30", 0, 12600, "+0330"},
+        {"UTC0", 0, 0, "UTC"}, {"LMT-0:20:59", 0, 1259, "LMT"}, {"XXX+3:59", 0, -14340, "XXX"}, {"<+0330>-3:30", 0, 12600, "+0330"},
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846799, 3600, "CET"},
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"}, {"EST5EDT", 1720000000, -14400, "EDT"},
         {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
         {"XXX3YYY2,J59/0,300/0", 1709089199, -10800, "XXX"},  // J59 is 28 February, in leap years too
         {"XXX3YYY2,J59/0,300/0", 1709089200, -7200, "YYY"},
+        {"XXX3YYY2,59/0,300/0", 1709175599, -10800, "XXX"},   // 59 is 29 February in leap years
+        {"XXX3YYY2,59/0,300/0", 1709175600, -7200, "YYY"}, {"XXX3YYY2,M2.5.6/0,M10.5.6/0", 1708743600, -7200, "YYY"},
         {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},  // J60 is 1 March in leap years, too
         {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"},
     };
@@ -152,7 +154,9 @@ TEST(ZoneRules, TextsOfRules) {
         EXPECT_EQ(rules->At(c.moment).abbreviation, c.name) << c.text;
     }
     for (const char* text : {"", "UTC", "5", "CET-1CEST,", "CET-1CEST,M3.5.0", "CET-1CEST,M13.5.0,M10.5.0",
-                             "CET-1CEST,M3.6.0,M10.5.0", "<CET-1", "CET-999", "UTC0x", "LMT0:60", "LMT0:0:60", "LMT0:0:"}) {
+                             "CET-1CEST,M3.6.0,M10.5.0", "CET-1CEST,M3.0.0,M10.5.0",
+                             "CET-1CEST,M0.5.0,M10.5.0", "CET-1CEST,M3.5.7,M10.5.0", "CET-1CEST,366,M10.5.0",
+                             "CET-1CEST,J366,M10.5.0", "<CET-1", "CET-999", "UTC0x", "LMT0:60", "LMT0:0:60", "LMT0:0:"}) {
         EXPECT_FALSE(ZoneRules::FromText(text)) << text;
     }
 }

@@ -21,6 +21,13 @@ TEST_F(StringCalls, AStringLivesThroughAssignmentsAndSizes) {
     ASSERT_EQ(OCIStringAssignText(env_, err_, Text("bye"), 3, &string), OCI_SUCCESS);
     EXPECT_EQ(string, first) << "assigned in place";
     EXPECT_EQ(Contents(string), "bye");
+    EXPECT_EQ(std::string_view(reinterpret_cast<char*>(OCIStringPtr(env_, string)), 5), std::string_view("bye\0\0", 5));
+    OCIString* copy = nullptr;
+    for (int times = 0; times < 2; ++times) {
+        ASSERT_EQ(OCIStringAssign(env_, err_, string, &copy), OCI_SUCCESS);
+        EXPECT_EQ(Contents(copy), "bye");
+        ASSERT_EQ(OCIStringAssignText(env_, err_, Text("other"), 5, &copy), OCI_SUCCESS);
+    }
     for (const ub4 room : {2u, 100u}) {
         ASSERT_EQ(OCIStringResize(env_, err_, room, &string), OCI_SUCCESS);
         EXPECT_EQ(Contents(string), "by");

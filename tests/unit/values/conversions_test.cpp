@@ -255,7 +255,7 @@ TEST_F(Conversions, Dates) {
     EXPECT_EQ(fetch("d", SQLT_ODT, 8).substr(0, 14), Hex(Raw(oci)).substr(0, 14));
 
     EXPECT_EQ(In(day, SQLT_DAT), "'2024-02-29 00:00:00'");
-    EXPECT_EQ(In(Raw(oci), SQLT_ODT), "'2024-02-29 00:00:00'");
+    EXPECT_EQ(In(Raw(OCIDate{2024, 2, 29, {13, 5, 9}}), SQLT_ODT), "'2024-02-29 13:05:09'");
     EXPECT_EQ(In(Raw(OCIDate{2024, 2, 30, {0, 0, 0}}), SQLT_ODT), "!1839");
     EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT), "!1841");
 }
@@ -526,7 +526,7 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
 TEST_F(Conversions, SizesThatATypeCannotHave) {
     const struct { ub2 type; sb4 size; sb4 answer; } cases[] = {
         {SQLT_INT, 3, 1483}, {SQLT_INT, 16, 1483}, {SQLT_INT, -4, 1483}, {SQLT_UIN, 5, 1483}, {SQLT_FLT, 2, 1483},
-        {SQLT_FLT, 16, 0}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0}, {SQLT_DAT, 6, 1483},
+        {SQLT_FLT, 16, 0}, {SQLT_FLT, 12, 1483}, {SQLT_NUM, 21, 1483}, {SQLT_VNU, 22, 0}, {SQLT_VNU, 100, 0}, {SQLT_DAT, 6, 1483},
         {SQLT_ODT, 7, 1483}, {SQLT_BFLOAT, 7, 1483}, {SQLT_BFLOAT, 5, 1483}, {SQLT_BFLOAT, 4, 0}, {SQLT_BDOUBLE, 8, 0},
         {SQLT_BDOUBLE, 9, 1483}, {SQLT_NUM, 0, 1483}, {SQLT_RID, 9, 1483}, {SQLT_PDN, 0, 1483}, {SQLT_CHR, -1, 1459},
         {SQLT_CHR, 0, 0}, {SQLT_STR, std::numeric_limits<sb4>::min(), 1459}, {SQLT_VCS, 1, 1459}, {SQLT_LVC, 3, 1459},
