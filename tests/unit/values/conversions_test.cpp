@@ -68,7 +68,7 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
         {"'a\xc3\xa4'", SQLT_CHR, 2, "6123", 1, 3},    // never half a character
         {"x'0AFF'", SQLT_CHR, 4, "30414646", 4, 0}, {"x'0AFF'", SQLT_BIN, 3, "0AFF23", 2, 0},
         {"x'0AFF'", SQLT_LBI, 1, "0A", 1, 2}, {"x'0AFF'", SQLT_VBI, 4, "02000AFF", 4, 0},
-        {"x'0AFF01'", SQLT_VBI, 4, "02000AFF", 4, 3}, {"'0aF'", SQLT_BIN, 4, "00AF2323", 2, 0},
+        {"x'0AFF01'", SQLT_VBI, 4, "02000AFF", 4, 3}, {"'0aF'", SQLT_BIN, 4, "00AF2323", 2, 0}, {"'09AFaf'", SQLT_BIN, 3, "09AFAF", 3, 0},
         {"''", SQLT_STR, 1, "00", 0, 0, true},
     };
     for (const auto& c : cases) {
@@ -79,7 +79,7 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
     }
     EXPECT_EQ(Hex(Out("printf('%.*c', 70000, 'x')", SQLT_VCS, 70002).substr(0, 3)), "FFFF78") << "all that it can tell";
     EXPECT_EQ(indicator_, -2);
-    EXPECT_EQ(Out("'0ag'", SQLT_BIN, 4), "!1465");
+    for (const char* text : {"'0ag'", "'0/'", "'0:'", "'0@'", "'0G'", "'0`'"}) EXPECT_EQ(Out(text, SQLT_BIN, 4), "!1465") << text;
     EXPECT_EQ(Out("12", SQLT_BIN, 4), "!932");
 }
 
@@ -115,7 +115,7 @@ TEST_F(Conversions, Integers) {
         {"-2.99", SQLT_INT, 4, -2, 0}, {"' 17 '", SQLT_INT, 4, 17, 0}, {"4.35 * 100", SQLT_INT, 4, 435, 0},
         {"9.95 * 100", SQLT_UIN, 2, 995, 0}, {"'1e3'", SQLT_INT, 4, 1000, 0}, {"'17x'", SQLT_INT, 4, 0, 1722},
         {"' '", SQLT_INT, 4, 0, 1722}, {"x'01'", SQLT_INT, 4, 0, 932}, {"255", SQLT_UIN, 1, 255, 0},
-        {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455}, {"-0.5", SQLT_UIN, 4, 0, 0},
+        {"256", SQLT_UIN, 1, 0, 1455}, {"-1", SQLT_UIN, 8, 0, 1455}, {"0", SQLT_UIN, 4, 0, 0}, {"-0.5", SQLT_UIN, 4, 0, 0},
         {"1.8e19", SQLT_UIN, 8, static_cast<sb8>(18000000000000000000u), 0},
         {"cast('18446744073709551615' as number)", SQLT_UIN, 8, -1, 0},
         {"cast('18446744073709551616' as number)", SQLT_UIN, 8, 0, 1455}, {"date '2024-01-01'", SQLT_INT, 4, 0, 1722, 932}};
@@ -147,6 +147,8 @@ TEST_F(Conversions, OtherNumbers) {
     EXPECT_EQ(length_, 0);
     EXPECT_EQ(Hex(Out("-12345", SQLT_PDN, 3)), "12345D");
     EXPECT_EQ(Hex(Out("7", SQLT_PDN, 3)), "00007C");
+    EXPECT_EQ(length_, 3);
+    EXPECT_EQ(Out("'1e60'", SQLT_PDN, 8), "!1457");
     EXPECT_EQ(Out("123456", SQLT_PDN, 3), "!1457");
     // In an area of their size, codes 21 and 22 are the machine's float and double.
     EXPECT_EQ(Out("0.1", SQLT_BFLOAT, 4), Raw(0.1f));
@@ -258,6 +260,11 @@ TEST_F(Conversions, Dates) {
     EXPECT_EQ(In(Raw(OCIDate{2024, 2, 29, {13, 5, 9}}), SQLT_ODT), "'2024-02-29 13:05:09'");
     EXPECT_EQ(In(Raw(OCIDate{2024, 2, 30, {0, 0, 0}}), SQLT_ODT), "!1839");
     EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT), "!1841");
+    OCIDate old{-44, 3, 15, {0, 0, 0}};
+    MustRun("delete from d");
+    ASSERT_EQ(Ready("insert into d(d) values(:1)", {{&old, sizeof old, SQLT_ODT}}), 0);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(One("select d from d"), "15-MAR-44");
 }
 
 TEST_F(Conversions, DatetimeDescriptors) {
@@ -267,6 +274,9 @@ TEST_F(Conversions, DatetimeDescriptors) {
     const char* const query = "select timestamp '2024-02-29 13:05:07.5' from dual";
     ASSERT_EQ(Query(query, {{&datetime, 8, SQLT_TIMESTAMP}}), 0);
     EXPECT_EQ(In(element, SQLT_TIMESTAMP), "'2024-02-29 13:05:07.5'");
+    ub2 length = 0;
+    ASSERT_EQ(Query(query, {{&datetime, 8, SQLT_TIMESTAMP, nullptr, &length}}), 0);
+    EXPECT_EQ(length, 8);
     void* const wrong[] = {nullptr, stmt, this};
     for (void* pointer : wrong) {
         EXPECT_EQ(In(Raw(pointer), SQLT_TIMESTAMP), "!21710");
@@ -507,6 +517,7 @@ TEST_F(Conversions, ElementsAsTheDatabaseSeesThem) {
         {Raw<sb1>(-5), SQLT_INT, -1, "-5"}, {Raw<sb8>(INT64_MIN), SQLT_INT, -1, "-9223372036854775808"},
         {Raw<ub1>(200), SQLT_UIN, -1, "200"}, {Raw(0.1f), SQLT_FLT, -1, "0.1"}, {Raw(-0.25), SQLT_FLT, -1, "-0.25"},
         {bytes("\x12\x34\x5D", 3), SQLT_PDN, -1, "-12345"}, {bytes("\x12\x34\x55", 3), SQLT_PDN, -1, "!1413"},
+        {bytes("\0\x0C", 2), SQLT_PDN, -1, "0"}, {"", SQLT_STR, -1, "NULL"},
         {bytes("\x1A\x34\x5C", 3), SQLT_PDN, -1, "!1413"}, {std::string(200, '\x99') + '\x9C', SQLT_PDN, -1, "!1426"},
         {bytes("\x02\xC1\x02", 3) + std::string(19, '\0'), SQLT_VNU, -1, "1"},
         {std::string(22, '\xFF'), SQLT_NUM, -1, "!1722"},
@@ -576,6 +587,7 @@ TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
     EXPECT_EQ(Execute(1), 24365) << "half a pair";
     ub2 length = 4;    // without its zero
     EXPECT_EQ(In(Encoded("xy"), SQLT_STR, "length(:1)"), "!1480");
+    EXPECT_EQ(In(std::string("\0\1\0\0", 4), SQLT_STR, "length(:1)").substr(0, 1), "1") << "U+0100";
     EXPECT_EQ(In(Encoded("xy"), SQLT_STR, "length(:1)", &length).substr(0, 1), "2");
 }
 
