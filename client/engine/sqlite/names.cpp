@@ -87,7 +87,6 @@ Names::Found Names::ColumnOf(const Table& table, std::string_view name) {
         if (!ReadColumn(database_, table.table, name, column)) return {};
         return {true, &columns_.emplace_back(std::move(column))};
     }
-    constexpr int kMostLooks = 1000;   // subqueries that join each other twice and twice again
     if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(table.query), "select")) return {};
     ++depth_;
     const Found found = ColumnOfQuery(table, PlainName(name));
@@ -95,20 +94,44 @@ Names::Found Names::ColumnOf(const Table& table, std::string_view name) {
     return found;
 }
 
-// By the select list of a subquery, and the names that WITH gives to its columns.
+// By the select list of a subquery, or the names that WITH gives to its columns.
 Names::Found Names::ColumnOfQuery(const Table& table, const std::string& name) {
-    const std::vector<Item> items = Items(table.query);
-    for (std::size_t index = 0; index < items.size(); ++index) {
-        const Item& item = items[index];
-        if (item.is_all && table.names.empty()) {
+    const auto is_called = [&](std::string_view called) { return sqlite3_stricmp(PlainName(called).c_str(), name.c_str()) == 0; };
+    if (!table.names.empty()) {
+        const auto named = std::find_if(table.names.begin(), table.names.end(), is_called);
+        std::vector<Found> columns;
+        const auto at = static_cast<std::size_t>(named - table.names.begin());
+        return named != table.names.end() && Expand(table.query, columns) && at < columns.size() ? columns[at] : Found();
+    }
+    for (const Item& item : Items(table.query)) {
+        if (item.is_all) {
             const Found found = FindName(name, item.qualifier, scopes_[table.query]);
             if (found.any) return found;
-            continue;
+        } else if (is_called(item.name)) {
+            return {true, TypeOf(item.expression)};
         }
-        const std::string_view called = index < table.names.size() ? table.names[index] : item.name;
-        if (sqlite3_stricmp(PlainName(called).c_str(), name.c_str()) == 0) return {true, TypeOf(item.expression)};
     }
     return {};
+}
+
+// The columns of a query in their order. False where that is not known: joins may merge columns in "*".
+bool Names::Expand(std::size_t query, std::vector<Found>& columns) {
+    if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(query), "select")) return false;
+    const bool merges = std::any_of(pieces_.begin(), pieces_.end(), [](auto piece) { return IsOneOf(piece, {"natural", "using"}); });
+    bool told = true;
+    ++depth_;
+    for (const Item& item : Items(query)) {
+        if (!item.is_all) columns.push_back({true, TypeOf(item.expression)});
+        else told = told && (!merges || !item.qualifier.empty());
+        for (const Table& table : tables_) {
+            const bool is_meant = item.qualifier.empty() || sqlite3_stricmp(table.name.c_str(), item.qualifier.c_str()) == 0;
+            if (!told || !item.is_all || !is_meant || table.scope != scopes_[query]) continue;
+            if (table.query != 0) told = Expand(table.query, columns);
+            else for (TableColumn& column : AllColumns(database_, table.table)) columns.push_back({true, &columns_.emplace_back(std::move(column))});
+        }
+    }
+    --depth_;
+    return told;
 }
 
 std::vector<Names::Item> Names::Items(std::size_t select) const {

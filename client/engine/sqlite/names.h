@@ -40,7 +40,8 @@ public:
     bool HasIntervals(std::size_t select, const std::string& qualifier);
 
 private:
-    static constexpr int kDeepest = 30;    // a recursive query looks into itself
+    static constexpr int kDeepest = 30;      // a recursive query looks into itself
+    static constexpr int kMostLooks = 1000;  // subqueries that join each other twice and twice again
 
     // A table or subquery of the statement, where it is named.
     struct Table {
@@ -69,6 +70,7 @@ private:
     Found Agreed(std::string_view name, Meant is_meant);
     Found ColumnOf(const Table& table, std::string_view name);
     Found ColumnOfQuery(const Table& table, const std::string& name);
+    bool Expand(std::size_t query, std::vector<Found>& columns);
     [[nodiscard]] Item ReadItem(Span span) const;
     [[nodiscard]] bool TableHasIntervals(const TableName& table) const;
     bool QueryHasIntervals(std::size_t query);

@@ -45,11 +45,9 @@ bool IsRowId(const std::string& name) {
 
 // A column of a view, or one that is called like a row id: a compiled query tells them.
 bool ReadByQuery(sqlite3* database, const TableName& table, const std::string& name, TableColumn& column) {
-    const std::string schema = table.schema.empty() ? "" : Quoted(table.schema) + '.';
-    const StatementHandle query = Compile(database, "select * from " + schema + Quoted(table.name));
-    for (int index = 0; index < sqlite3_column_count(query.get()); ++index) {
-        if (sqlite3_stricmp(sqlite3_column_name(query.get(), index), name.c_str()) != 0) continue;
-        column = Described(sqlite3_column_name(query.get(), index), sqlite3_column_decltype(query.get(), index));
+    for (TableColumn& told : AllColumns(database, table)) {
+        if (sqlite3_stricmp(told.name.c_str(), name.c_str()) != 0) continue;
+        column = std::move(told);
         return true;
     }
     return false;
@@ -80,6 +78,15 @@ bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name
 }
 
 // The engine's own list leaves out those that are calculated.
+std::vector<TableColumn> AllColumns(sqlite3* database, const TableName& table) {
+    std::vector<TableColumn> columns;
+    const std::string schema = table.schema.empty() ? "" : Quoted(table.schema) + '.';
+    const StatementHandle query = Compile(database, "select * from " + schema + Quoted(table.name));
+    for (int index = 0; index < sqlite3_column_count(query.get()); ++index)
+        columns.push_back(Described(sqlite3_column_name(query.get(), index), sqlite3_column_decltype(query.get(), index)));
+    return columns;
+}
+
 std::vector<TableColumn> InsertableColumns(sqlite3* database, const TableName& table) {
     std::vector<TableColumn> columns;
     const StatementHandle list =

@@ -23,6 +23,9 @@ struct TableColumn {
 // The column of that name, which may be quoted, of a table or view; false when there is none. A row id is none.
 bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name, TableColumn& column);
 
+// What "*" stands for, as a compiled query tells it; none when there is no such table or view.
+std::vector<TableColumn> AllColumns(sqlite3* database, const TableName& table);
+
 // The columns that an insert without names gives values to, in their order; none when there is no such table.
 std::vector<TableColumn> InsertableColumns(sqlite3* database, const TableName& table);
 

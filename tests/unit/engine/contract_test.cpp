@@ -755,7 +755,7 @@ TEST_P(Contract, PasswordChangeIsForGood) {
     ASSERT_EQ(LogOn(owner_, "secret"), 0);
     ASSERT_EQ(Answer(database_->Connect({owner_, "secret", false}, stop_, connection_)), 0);
     const struct { std::string user, old_password, new_password; int number; } refused[] = {
-        {owner_, "wrong", "new", 28008}, {"bob", "secret", "new", 1017},
+        {owner_, "wrong", "new", 28008}, {owner_, std::string("secret\0x", 8), "new", 28008}, {"bob", "secret", "new", 1017},
         {owner_, "secret", std::string("a\0b", 3), 1017}};
     for (const auto& c : refused)
         EXPECT_EQ(Answer(connection_->ChangePassword(c.user, c.old_password, c.new_password)), c.number) << c.user;
@@ -1150,6 +1150,10 @@ TEST_P(LobContract, TemporaryOneOutlivesTransactionsAndConnection) {
     ASSERT_EQ(Answer(lob->Trim(150000)), 0);
     for (const std::size_t at : {0, 4095, 65530, 131070, 149990})
         EXPECT_EQ(Read(*lob, at), text.substr(at, std::min<std::size_t>(100, 150000 - at))) << at;
+    ASSERT_EQ(Write(*lob, 300000, "end"), 0);                  // behind a gap
+    EXPECT_EQ(Read(*lob, 149990), text.substr(149990, 10) + std::string(90, '\0'));
+    EXPECT_EQ(Read(*lob, 262100), std::string(100, '\0'));
+    EXPECT_EQ(Read(*lob, 299990), std::string(10, '\0') + "end");
     EXPECT_TRUE(lob->IsTemporary());
 }
 

@@ -100,6 +100,8 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from (select t.*, 1 as one from t) where d > % and one = 1", "01-JAN-24", "1;"},
         {"select id from (select distinct id, trunc(d) day from t) x where x.day = %", "03-FEB-24", "1;"},
         {"with x(a, b) as (select id, d from t) select a from x where b > %", "01-JAN-24", "1;"},
+        {"with x(k, a, d, e, f, g, h) as (select 1, y.* from u, (select * from t) y) select a from x where d > %", "31-JAN-24", "1;"},
+        {"select id from t where coalesce(d, sysdate) > %", "31-JAN-24", "1;"},
         {"with u as (select id, d from t), y as (select u.*, 1 as k from u) select id from y z where z.d > %", "01-JAN-24",
          "1;"},
         {"with recursive x(k, y) as (select id, d from t union all select k + 2, y from x where k < 3 and y > %)"
@@ -365,6 +367,7 @@ TEST_F(SqliteDescribes, SizesInCharactersAndInBytes) {
         {"cast('äöü' as varchar2(3))", "ä;", "CAST('äöü' AS VARCHAR2(3))"},
         {"cast('äöü' as varchar2(2 char))", "äö;", "CAST('äöü' AS VARCHAR2(2 CHAR))"},
         {"cast('äöü' as nvarchar2(2))", "äö;", "CAST('äöü' AS NVARCHAR2(2))"},
+        {"cast('1 2:3:4.56' as interval day(4) to second(1))", "+0001 02:03:04.6;", "CAST('1 2:3:4.56' AS INTERVAL DAY(4) TO SECOND(1))"},
         {"cast('ä' as char(3)) || '.'", "ä .;", "CAST('ä' AS CHARACTER(3)) || '.'"},
         {"cast('ä' as nchar(3)) || '.'", "ä  .;", "CAST('ä' AS NCHAR(3)) || '.'"}};
     for (const auto& c : casts) {
