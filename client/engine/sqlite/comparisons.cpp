@@ -75,8 +75,21 @@ private:
             for (std::size_t index = 0; index < lefts.size(); ++index) Compare(lefts[index], rights[index]);
             return;
         }
-        if (const TableColumn* column = ConcerningType(left)) Use(right, *column);
+        const TableColumn* const column = ConcerningType(left);
+        if (column) Use(right, *column);
         else if (const TableColumn* other = ConcerningType(right)) Use(left, *other);
+        UseChoices(left);
+        UseChoices(right);
+    }
+
+    // What stands beside a date in nvl or CASE is read as one, too.
+    void UseChoices(Span span) {
+        const TableColumn* const column = ConcerningType(span);
+        if (!column || !IsDateType(column->column.type)) return;
+        for (const Span choice : operands_.Choices(operands_.Bare(span))) {
+            Use(choice, *column);
+            UseChoices(choice);
+        }
     }
 
     Span Subject(std::size_t at) const { return operands_.Before(IsWord(At(at - 1), "not") ? at - 1 : at); }

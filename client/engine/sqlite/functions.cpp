@@ -213,7 +213,6 @@ constexpr struct {
     {"count", {"number"}}, {"sum", {"number"}}, {"total", {"number"}}, {"avg", {"number"}},
     {"abs", {"number"}},   {"round", {"number"}}, {"length", {"number"}}, {"row_number", {"number"}},
     {"rank", {"number"}},  {"dense_rank", {"number"}}, {"max", {"", 1}}, {"min", {"", 1}},
-    {"coalesce", {"", 1}}, {"ifnull", {"", 1}},
 };
 
 std::array<std::span<const FunctionRow>, 4> Tables() {

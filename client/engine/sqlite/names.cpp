@@ -20,6 +20,10 @@ const TableColumn* Names::TypeOf(Span span) {
     span = operands_.Bare(span);
     if (span.Size() == 0 || operands_.IsValue(span)) return nullptr;
     if (operands_.IsColumn(span)) return Resolve(span);
+    for (const Span choice : operands_.Choices(span)) {
+        const TableColumn* const column = TypeOf(choice);
+        if (column && IsMoment(column->column)) return column;
+    }
     if (!IsName(At(span.first))) return nullptr;
     const ExpressionType type = ReadType({pieces_.begin() + static_cast<std::ptrdiff_t>(span.first),
                                           pieces_.begin() + static_cast<std::ptrdiff_t>(span.last)});

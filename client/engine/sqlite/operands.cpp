@@ -178,6 +178,19 @@ std::vector<Span> Operands::List(Span span) const {
     return parts;
 }
 
+std::vector<Span> Operands::Choices(Span span) const {
+    if (IsOneOf(At(span.first), {"nvl", "coalesce", "ifnull"})) return List({span.first + 1, span.last});
+    std::vector<Span> values;
+    if (!IsWord(At(span.first), "case") || CaseEnd(span.first) != span.last) return values;
+    int depth = 0;
+    for (std::size_t at = span.first; at < span.last; ++at) {
+        if (IsWord(At(at), "case")) ++depth;
+        if (IsWord(At(at), "end")) --depth;
+        if (depth == 1 && IsOneOf(At(at), {"then", "else"})) values.push_back(From(at + 1));
+    }
+    return values;
+}
+
 std::size_t Operands::FirstExpression() const {
     if (IsOneOf(At(0), {"select", "with", "values", "insert", "replace", "update", "delete"})) return 0;
     if (!IsWord(At(0), "create")) return pieces_.size();

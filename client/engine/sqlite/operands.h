@@ -32,6 +32,8 @@ public:
     [[nodiscard]] bool IsQuery(Span span) const;
     // The parts of (a, b, c); none for anything else.
     [[nodiscard]] std::vector<Span> List(Span span) const;
+    // The values that a CASE, or a call like nvl, gives one of; none for anything else.
+    [[nodiscard]] std::vector<Span> Choices(Span span) const;
 
     // Queries and changes are looked through from their start, what they define or explain is not; of create table and
     // create view their query is.

@@ -101,7 +101,10 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from (select distinct id, trunc(d) day from t) x where x.day = %", "03-FEB-24", "1;"},
         {"with x(a, b) as (select id, d from t) select a from x where b > %", "01-JAN-24", "1;"},
         {"with x(k, a, d, e, f, g, h) as (select 1, y.* from u, (select * from t) y) select a from x where d > %", "31-JAN-24", "1;"},
-        {"select id from t where coalesce(d, sysdate) > %", "31-JAN-24", "1;"},
+        {"select id from t where coalesce(null, d) > %", "31-JAN-24", "1;"},
+        {"select id from t where d = nvl(d, %) and nvl(null, nvl(d, sysdate)) > %", "31-JAN-24", "1;"},
+        {"select id from t where case when id = 2 then d else % end > '31-JAN-24'", "03-FEB-24", "1;"},
+        {"select id from t where d = case id when 9 then d else case id when 1 then % end end", "03-FEB-24", "1;"},
         {"with u as (select id, d from t), y as (select u.*, 1 as k from u) select id from y z where z.d > %", "01-JAN-24",
          "1;"},
         {"with recursive x(k, y) as (select id, d from t union all select k + 2, y from x where k < 3 and y > %)"
