@@ -234,6 +234,29 @@ TEST_F(Executing, BlockOpensResultSets) {
     }
 }
 
+// What the server says besides comes with a success, in its order; behind a truncation, which is told first.
+TEST_F(Executing, NoticesAreInformation) {
+    MustRun("begin", "rollback");
+    if (!OnServer()) return;
+    MustRun("create function told() returns text language plpgsql as "
+            "$$ begin raise warning 'one'; raise warning 'two'; return 'abc'; end $$");
+    for (const bool cut : {false, true}) {
+        char text[9] = "";
+        ub2 code = 0;
+        ASSERT_EQ(Prepare("select told() from dual") + Define(1, {text, cut ? 3 : 9, SQLT_STR, nullptr, nullptr, &code}), 0);
+        EXPECT_EQ(ExecuteCode(), OCI_SUCCESS_WITH_INFO);
+        std::string told;
+        char words[200];
+        sb4 number = 0;
+        const auto get = [&](ub4 record) {
+            return OCIErrorGet(err, record, nullptr, &number, reinterpret_cast<OraText*>(words), sizeof words, OCI_HTYPE_ERROR);
+        };
+        for (ub4 record = 1; get(record) == OCI_SUCCESS; ++record)
+            told += std::to_string(number) + (std::strstr(words, "one") ? " one " : std::strstr(words, "two") ? " two " : " ");
+        EXPECT_EQ(told, cut ? "24345 20000 one 20000 two " : "20000 one 20000 two ");
+    }
+}
+
 // What the driver shows its decimal floats with.
 TEST_F(Executing, ValuesIsAQueryOfOneRow) {
     EXPECT_EQ(One("values( cast( cast('1.50' as decfloat(34)) as varchar(100)))"), OnServer() ? "1.50" : "1.5");
