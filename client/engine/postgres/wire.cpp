@@ -20,6 +20,7 @@ using namespace std::chrono_literals;
 using Clock = std::chrono::steady_clock;
 
 constexpr auto kBetweenCancels = 200ms;
+constexpr auto kStarving = 2s;
 constexpr std::int64_t kLong = std::int64_t{16} << 20;    // bytes
 constexpr int kNoticeNumber = 20000;    // what the server, or code in it, tells in its own words
 constexpr auto kForever = Clock::time_point::max();
@@ -200,8 +201,13 @@ bool Wire::Wait() noexcept {
     const bool stopping = heeds_ && Asked();
     if (stopping && Clock::now() - cancelled_ > kBetweenCancels) Cancel();
     pollfd places[] = {{PQsocket(connection_), static_cast<short>(more ? POLLIN | POLLOUT : POLLIN), 0}, {wake_, POLLIN, 0}};
-    const auto end = stopping ? Clock::now() + kBetweenCancels : kForever;
-    if (poll(places, heeds_ ? 2 : 1, Milliseconds(end)) < 0) return errno == EINTR;
+    // What libpq had no room for it has dropped, and may wait for for ever.
+    const bool starves = std::strstr(PQerrorMessage(connection_), "out of memory") != nullptr;
+    const auto end = stopping ? Clock::now() + kBetweenCancels : starves ? Clock::now() + kStarving : kForever;
+    const int ready = poll(places, heeds_ ? 2 : 1, Milliseconds(end));
+    if (ready < 0) return errno == EINTR;
+    if (ready == 0 && starves && !stopping) broken_ = short_of_memory_ = true;
+    if (broken_) return false;
     if (places[1].revents & POLLIN) {
         std::uint64_t count = 0;
         if (read(wake_, &count, sizeof count) < 0) count = 0;    // somebody else's wake was as good
@@ -211,7 +217,10 @@ bool Wire::Wait() noexcept {
 
 Result Wire::Next() noexcept {
     if (broken_) return nullptr;
+    if (Idle() && PQisBusy(connection_)) broken_ = short_of_memory_ = true;    // libpq had no room for an answer, and lost count
+    if (broken_) return nullptr;
     while (PQisBusy(connection_) && Wait()) continue;
+    if (broken_) return nullptr;
     Result result(PQgetResult(connection_));
     if (result && PQresultStatus(result.get()) == PGRES_PIPELINE_SYNC) --syncs_;
     if (PQstatus(connection_) == CONNECTION_BAD) broken_ = true;
