@@ -192,7 +192,9 @@ TEST_F(Postgres, StopIsHeededBehindSignals) {
         stop_->Ask();
         connection_->Interrupt();
     });
+    const auto start = std::chrono::steady_clock::now();
     EXPECT_EQ(Query("select 1 from pg_sleep(5)"), "error 1013");
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(4));
     breaker.join();
 }
 
