@@ -256,6 +256,8 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     EXPECT_EQ(Shown(date, ""), "15-JUL-24");
     EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, date, 2024, 7, 16, 13, 14, 15, 0, nullptr, 0)), 0);
     EXPECT_EQ(Shown(date, "DD HH24:MI:SS"), "16 00:00:00");
+    EXPECT_EQ(Shown(date, "FF"), "1821");
+    EXPECT_EQ(Shown(NewDescriptor<OCIDateTime>(OCI_DTYPE_TIME), "MI"), "1866");
     auto* now = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     EXPECT_EQ(Answer(OCIDateTimeSysTimeStamp(env_, err_, now)), 0);
     sword order = 0;

@@ -123,6 +123,11 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
     }
     EXPECT_EQ(OCIEnvCreate(nullptr, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_ERROR);
     EXPECT_EQ(OCIHandleAlloc(env_, nullptr, OCI_HTYPE_STMT, 0, nullptr), OCI_ERROR);
+    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 21560);
+    for (const bool given : {true, false}) {
+        EXPECT_EQ(OCIArrayDescriptorAlloc(env_, given ? &out : nullptr, OCI_DTYPE_LOB, given ? 0 : 1, 0, nullptr), OCI_ERROR);
+        EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 21560);
+    }
     EXPECT_EQ(OCILogon(env_, err_, nullptr, nullptr, 0, nullptr, 0, nullptr, 0), OCI_ERROR);
     EXPECT_EQ(OCIServerVersion(server, err_, nullptr, 0, OCI_HTYPE_SERVER), OCI_ERROR);
 }

@@ -412,6 +412,7 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     boolean flag = TRUE;
     char room[10];
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 22275);
+    EXPECT_EQ(Answer(OCILobLocatorIsInit(env, err, lob, nullptr)), 21560);
     EXPECT_EQ(Answer(OCILobLocatorIsInit(env, err, lob, &flag)), 0);
     EXPECT_EQ(flag, FALSE);
     EXPECT_EQ(OCILobGetLength(svc, err, nullptr, &length), OCI_ERROR);
@@ -438,6 +439,9 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     char bytes[] = "\xC3\xB6xyz";
     EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, &far, nullptr, 1, bytes, 5, 0, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(Read(lob, 4), "4:\xC3\xB6xll") << "the amount in bytes";
+    oraub8 two = 2;
+    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &two, 1, bytes, 5, 0, nullptr, nullptr, 0, 0)), 0);
+    EXPECT_EQ(two, 2u) << "in characters";
     oraub8 units = 0;
     EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, &far, &units, 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(far * 10 + units, 32u) << "bytes and characters";

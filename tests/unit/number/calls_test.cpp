@@ -91,6 +91,16 @@ TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
     EXPECT_EQ(OCINumberToRealArray(error_, values, 2, 8, reals), OCI_ERROR);
     EXPECT_EQ(Recorded(), 21560);
     EXPECT_EQ(reals[0], -1234.5) << "what comes before is converted";
+    const auto answer = [&](sword code) { return code == OCI_ERROR ? Recorded() : code; };
+    OCINumber other{};
+    size = sizeof text;
+    const sb4 missing[] = {
+        answer(OCINumberFromReal(error_, reals, 8, nullptr)), answer(OCINumberFromReal(error_, reals, 3, &other)),
+        answer(OCINumberToReal(error_, &value, 3, reals)), answer(OCINumberToRealArray(error_, values, 1, 8, nullptr)),
+        answer(OCINumberToText(error_, nullptr, nullptr, 0, nullptr, 0, &size, text))};
+    for (const sb4& number : missing) EXPECT_EQ(number, 21560) << &number - missing;
+    OCINumberSetZero(error_, &other);
+    EXPECT_EQ(other.OCINumberPart[1], 128);
     const OCINumber small = Number("255");
     const std::string wide = Bytes(std::string(300, 'X'));    // longer than most texts
     std::string shown(1000, '#');

@@ -78,7 +78,9 @@ TEST_F(NlsCalls, NamesAndSettings) {
         EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, c.item)), 0);
         EXPECT_STREQ(text, c.text);
     }
-    EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, 39)), 12702);
+    for (const ub2 item : {0, 39}) EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, item)), 12702);
+    EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), 6, 1)), 22059);
+    EXPECT_EQ(OCINlsCharSetNameToId(env_, nullptr), 0);
     const struct { ub2 item; sb4 value; } numbers[] = {{91, 1}, {92, 1}, {93, 178}, {94, 1000}};
     for (const auto& c : numbers) {
         sb4 value = -1;
@@ -89,6 +91,7 @@ TEST_F(NlsCalls, NamesAndSettings) {
     ub2 id = 0;
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 0, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
     EXPECT_GT(id, 0);
+    EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 2, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
     setenv("LC_ALL", "no_such.locale", 1);
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 0, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_SUCCESS);
     EXPECT_EQ(id, 873);
