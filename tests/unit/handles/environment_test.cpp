@@ -55,7 +55,8 @@ TEST(ErrorTexts, NumberStateAndWords) {
                  {1843, "22008", "not a valid month"}, {2091, "40000", nullptr}, {2292, "23000", nullptr},
                  {3114, "66000", "not connected"}, {6511, "24000", nullptr}, {6512, "65000", nullptr},
                  {8177, "40001", nullptr}, {12154, "66000", nullptr}, {12899, "22001", nullptr},
-                 {20500, "HY000", "application error"}, {24374, "HY000", "define missing before fetch"},
+                 {19999, "HY000", "message not found"}, {20000, "HY000", "application error"},
+                 {20999, "HY000", "application error"}, {21000, "HY000", "message not found"}, {24374, "HY000", "define missing before fetch"},
                  {99999, "HY000", "message not found"}};
     for (const auto& c : cases) {
         EXPECT_EQ(SqlState(c.number), c.state) << c.number;

@@ -107,15 +107,10 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     EXPECT_EQ(unknown.ose, 0);
     EXPECT_EQ(LogOn(lda), 1015);
     Lda_Def other{};
-    EXPECT_EQ(olog(&other, nullptr, nullptr, 0, nullptr, 0, T(":memory:"), 8, 2), 24300);
-    EXPECT_EQ(opinit(2), 24300);
     EXPECT_EQ(opinit(1), 0);
     EXPECT_EQ(olog(&other, nullptr, nullptr, 0, nullptr, 0, T(":memory:"), 8, 0), 24301);
     EXPECT_EQ(olog(&other, host.data(), nullptr, -2, nullptr, 0, T(":memory:"), 8, 0), 1025);
     EXPECT_EQ(opinit(0), 0);
-    sqllda(&other);
-    EXPECT_EQ(other.rc, 1012);
-    EXPECT_EQ(ocom(&other), 1001);
 }
 
 TEST_F(LegacyCalls, LoginsSwitchTheirModesAndEndTheirCursors) {
@@ -152,9 +147,6 @@ TEST_F(LegacyCalls, LoginsSwitchTheirModesAndEndTheirCursors) {
 }
 
 TEST_F(LegacyCalls, TextsAreParsedAtOnceOrLater) {
-    EXPECT_EQ(oparse(&cda, nullptr, -1, 0, 2), 1009);
-    EXPECT_EQ(oparse(&cda, T("select 1 from dual"), -1, 0, 3), 1025);
-    EXPECT_EQ(oparse(&cda, T("select 1 from dual"), -2, 0, 2), 1025);
     EXPECT_EQ(oparse(&cda, T("select 1 from dual"), 0x7FFFFFFF, 0, 2), 0) << "its zero ends it";
     EXPECT_EQ(Parse("select n, x from t", 0), 904);
     EXPECT_EQ(cda.peo, 10);
@@ -261,10 +253,6 @@ TEST_F(LegacyCalls, PackedDecimalsHaveAScale) {
 TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
     ASSERT_EQ(Parse("insert into t values (:1, :text)"), 0);
     EXPECT_EQ(oexec(&cda), 1008);
-    EXPECT_EQ(Bind(":none", characters.data(), 8, SQLT_STR), 1036);
-    for (const sword position : {0, 2}) {
-        EXPECT_EQ(obndrn(&cda, position, host.data(), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1), 1036);
-    }
     for (const sword type : {SQLT_CLOB, SQLT_CUR, SQLT_RDD, SQLT_VST, 91, 65536 + SQLT_CHR, -1}) {
         EXPECT_EQ(Bind(":text", characters.data(), 8, type), 1024) << type;
     }
@@ -275,7 +263,6 @@ TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
         EXPECT_EQ(Bind(":text", host.data(), -1, type), 0) << type;
     }
     EXPECT_EQ(Bind(":text", nullptr, -1, SQLT_STR), 1025);
-    EXPECT_EQ(obndrv(&cda, nullptr, 0, host.data(), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1), 1009);
     EXPECT_EQ(oexn(&cda, 2, 2), 24333);
     ASSERT_EQ(Parse("create unique index u on t (n)", 0), 0);
     std::array<int, 4> numbers{7, 1, 2, 1};
@@ -296,7 +283,6 @@ TEST_F(LegacyCalls, ValuesGoInPieces) {
         return obindps(&cda, opcode, T(":c"), -1, reinterpret_cast<ub1*>(&context), 10, SQLT_CHR, -1, nullptr, nullptr,
                        nullptr, 0, 0, 0, skip, 0, nullptr, nullptr, -1, -1);
     };
-    EXPECT_EQ(bind(2), 1025);
     EXPECT_EQ(bind(1, -1), 1025);
     ASSERT_EQ(bind(0), 0);
     EXPECT_EQ(oexec(&cda), 3129);
@@ -335,7 +321,6 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
     const auto* const words = reinterpret_cast<const char*>(message.data());
     EXPECT_EQ(oermsg(-1403, message.data()), 0);
     EXPECT_STREQ(words, "[KELP/CLIENT] ORA-01403: no data found\n");
-    EXPECT_EQ(oermsg(1, nullptr), 1009);
     EXPECT_EQ(Parse("select x from t", 0), 904);
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 512), 0);
     const char* const told = server ? "column \"x\" does not exist" : "no such column: x";
