@@ -162,7 +162,7 @@ void AttributesTest::Check(char kind, const Handle& handle, const Known& known) 
     const bool is_text = number == OCI_ATTR_PASSWORD || number == OCI_ATTR_CLIENT_IDENTIFIER || number > 360;
     if (width == 't' || is_text) pointer = const_cast<char*>("MAIN");
     if (is_integer || handle.type == OCI_HTYPE_DESCRIBE) pointer = &value;
-    if (width == 'g') pointer = identifier;
+    if (width == 'g' || (width == 'h' && kind == 'x')) pointer = identifier;
     EXPECT_EQ(Set(handle.pointer, handle.type, number, pointer, width == 'g' ? 140 : pointer ? 4 : 0), is_set ? 0 : 24315);
     if (!is_set || width == 0) return;
     ASSERT_EQ(get(), 0);
@@ -170,6 +170,7 @@ void AttributesTest::Check(char kind, const Handle& handle, const Known& known) 
     if (is_integer) std::memcpy(&read, area, bytes);
     EXPECT_EQ(read, is_integer ? value : 0) << "read back";
     EXPECT_TRUE(width != 't' || Name(handle.pointer, known.number, handle.type) == "MAIN");
+    EXPECT_TRUE(width != 'h' || std::memcmp(area, &pointer, sizeof pointer) == 0);
     EXPECT_TRUE(width != 'g' || std::memcmp(area, identifier, 140) == 0);
 }
 
@@ -319,8 +320,10 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     EXPECT_EQ(Describe(describe, Schema(), OCI_PTYPE_SCHEMA), 0);
     EXPECT_EQ(OCIDescriptorFree(columns, OCI_DTYPE_PARAM), OCI_INVALID_HANDLE) << "gone with what it described";
     const std::string database = OnServer() ? ann_.substr(4) : "memory";    // of the owner's name
-    EXPECT_EQ(Attribute<ub1>(Described(database.c_str(), OCI_PTYPE_DATABASE), OCI_DTYPE_PARAM, OCI_ATTR_NOWAIT_SUPPORT),
+    dvoid* const described = Described(database.c_str(), OCI_PTYPE_DATABASE);
+    EXPECT_EQ(Attribute<ub1>(described, OCI_DTYPE_PARAM, OCI_ATTR_NOWAIT_SUPPORT),
               OnServer() ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED);
+    EXPECT_EQ(Attribute<ub2>(described, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_ID), 873);
 }
 
 TEST_F(AttributesTest, CurrentSchema) {
