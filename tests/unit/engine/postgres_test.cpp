@@ -403,9 +403,10 @@ TEST_F(Postgres, LongArraysAreOneStatement) {
                "create function f() returns trigger language plpgsql as $$ begin insert into s values(1); return null; end $$",
                "create trigger g after insert on t execute function f()");
     const engine::RowId row{};
+    const date::DateTime day{.year = 2024, .month = 1, .day = 1};
     const struct { const char* sql; std::vector<Datum> values; const char* statements; } cases[] = {
         {"insert into t(n, v) values(%1, %2)", {Integer(1), Text("x")}, "1;"},
-        {"INSERT INTO T(M) VALUES ( %1 )", {Moment({.year = 2024, .month = 1, .day = 1})}, "1;"},
+        {"INSERT INTO T(M) VALUES ( %1 )", {Moment(day)}, "1;"},
         {"insert into t(m) values(%1)", {Text("01-JAN-24")}, "20;"},    {"insert into t(r) values(%1)", {Row(row)}, "20;"},
         {"insert into t(n) values(%1)", {Null()}, "20;"},               {"insert into t values(default)", {}, "20;"},
         {"insert into t(n) values(abs(%1))", {Integer(1)}, "20;"},      {"insert into t(n) select %1", {Integer(1)}, "20;"}};
