@@ -94,17 +94,15 @@ protected:
 
 TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     const Cda_Def before = unknown;
-    for (Cda_Def* area : {static_cast<Cda_Def*>(nullptr), &unknown, &lda}) {
+    for (Cda_Def* area : {&unknown, &lda}) {
         EXPECT_EQ(oparse(area, T("select 1 from dual"), -1, 0, 2), 1001);
         for (auto* call : {oexec, ofetch, ocan, oclose}) EXPECT_EQ(call(area), 1001);
     }
-    for (Lda_Def* area : {static_cast<Lda_Def*>(nullptr), &unknown, &cda}) {
+    for (Lda_Def* area : {&unknown, &cda})
         for (auto* call : {ologof, ocom, orol, ocon, ocof, obreak, onbset, onbclr, onbtst}) EXPECT_EQ(call(area), 1001);
-    }
     EXPECT_EQ(std::memcmp(&before, &unknown, sizeof unknown), 0);
     EXPECT_EQ(oopen(&unknown, &cda, nullptr, -1, -1, nullptr, -1), 1001);    // a maker: clears, and leaves rc
-    EXPECT_EQ(unknown.rc, 1001);
-    EXPECT_EQ(unknown.ose, 0);
+    EXPECT_EQ(std::make_tuple(unknown.rc, unknown.ose), std::make_tuple(1001, 0));
     EXPECT_EQ(LogOn(lda), 1015);
     Lda_Def other{};
     EXPECT_EQ(opinit(1), 0);
@@ -113,24 +111,11 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     EXPECT_EQ(opinit(0), 0);
 }
 
-TEST_F(LegacyCalls, LoginsSwitchTheirModesAndEndTheirCursors) {
-    EXPECT_EQ(onbtst(&lda), 3128);
-    for (int times = 0; times < 2; ++times) EXPECT_EQ(onbset(&lda), 0);
-    EXPECT_EQ(onbtst(&lda), 0);
-    EXPECT_EQ(onbclr(&lda), 0);
+TEST_F(LegacyCalls, AreasTellOfTheirCall) {
     EXPECT_EQ(onbtst(&lda), 3128);
     EXPECT_EQ(lda.v2_rc, -3128);
-
-    Fill(3);
-    EXPECT_EQ(orol(&lda), 0);
-    EXPECT_EQ(Parse("delete from t"), 0);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(cda.rpc, 0u);
-    EXPECT_EQ(ocon(&lda), 0);
     Fill(2);
-    EXPECT_EQ(orol(&lda), 0);
-    EXPECT_EQ(Parse("delete from t"), 0);
-    EXPECT_EQ(oexec(&cda), 0);
+    EXPECT_EQ(Run("delete from t"), 0);
     EXPECT_EQ(std::make_tuple(cda.rpc, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(2u, 0u, 0));
     if (!server) {
         EXPECT_EQ(Run("insert into t (rowid, n) values (1 * 65536 * 65536 * 65536 + 131075, 1)"), 0);
@@ -140,17 +125,12 @@ TEST_F(LegacyCalls, LoginsSwitchTheirModesAndEndTheirCursors) {
     EXPECT_EQ(odessp(&lda, T("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
                      nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &count), 4043);
     EXPECT_EQ(count, 0u);
-
-    EXPECT_EQ(ologof(&lda), 0);
-    EXPECT_EQ(oexec(&cda), 1001);
-    EXPECT_EQ(LogOn(lda), 0);
 }
 
 TEST_F(LegacyCalls, TextsAreParsedAtOnceOrLater) {
     EXPECT_EQ(oparse(&cda, T("select 1 from dual"), 0x7FFFFFFF, 0, 2), 0) << "its zero ends it";
     EXPECT_EQ(Parse("select n, x from t", 0), 904);
-    EXPECT_EQ(cda.peo, 10);
-    EXPECT_EQ(cda.v2_rc, -904);
+    EXPECT_EQ(std::make_tuple(cda.peo, cda.v2_rc), std::make_tuple(10, -904));
     EXPECT_EQ(oexec(&cda), 1003);
     EXPECT_EQ(Parse("select x from t"), 0);
     EXPECT_EQ(cda.ft, 4);
@@ -174,10 +154,7 @@ TEST_F(LegacyCalls, ColumnsAreDescribedUntilThereIsNone) {
     EXPECT_EQ(Define(1, &number, 4, SQLT_INT), 0);
     EXPECT_EQ(oexec(&cda), 0);
     EXPECT_EQ(ocan(&cda), 0);
-    for (const sword position : {0, 3, 70000, -1}) {
-        EXPECT_EQ(odescr(&cda, position, &size, &type, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 1007);
-        EXPECT_EQ(Define(position, &number, 4, SQLT_INT), 1007);
-    }
+    EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);
     EXPECT_EQ(odescr(&cda, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
     ASSERT_EQ(Parse("select n from t"), 0);
     EXPECT_EQ(Define(2, &number, 4, SQLT_INT), 0);       // nobody knows yet
@@ -189,10 +166,8 @@ TEST_F(LegacyCalls, FetchesCountAndEnd) {
     ASSERT_EQ(Parse("select n, c from t order by n"), 0);
     EXPECT_EQ(ofetch(&cda), 1002);
     EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(ofetch(&cda), 24374);
     std::array<int, 3> numbers{};
     EXPECT_EQ(Define(1, numbers.data(), 4, SQLT_INT), 0);
-    EXPECT_EQ(ofen(&cda, 0), 24333);
     EXPECT_EQ(ofetch(&cda), 0);
     EXPECT_EQ(ofen(&cda, 3), 0);
     EXPECT_EQ(cda.rpc, 4u);
@@ -218,8 +193,6 @@ TEST_F(LegacyCalls, FetchesCountAndEnd) {
     }
     EXPECT_EQ(oexfet(&cda, 5, 0, 1), 0);
     EXPECT_EQ(many[4], 5);
-    ASSERT_EQ(Parse("delete from t"), 0);
-    EXPECT_EQ(oexfet(&cda, 1, 0, 0), 1002);
 }
 
 TEST_F(LegacyCalls, RowsThatCannotBeStoredArePassedOver) {
@@ -252,7 +225,6 @@ TEST_F(LegacyCalls, PackedDecimalsHaveAScale) {
 
 TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
     ASSERT_EQ(Parse("insert into t values (:1, :text)"), 0);
-    EXPECT_EQ(oexec(&cda), 1008);
     for (const sword type : {SQLT_CLOB, SQLT_CUR, SQLT_RDD, SQLT_VST, 91, 65536 + SQLT_CHR, -1}) {
         EXPECT_EQ(Bind(":text", characters.data(), 8, type), 1024) << type;
     }
@@ -263,13 +235,6 @@ TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
         EXPECT_EQ(Bind(":text", host.data(), -1, type), 0) << type;
     }
     EXPECT_EQ(Bind(":text", nullptr, -1, SQLT_STR), 1025);
-    EXPECT_EQ(oexn(&cda, 2, 2), 24333);
-    ASSERT_EQ(Parse("create unique index u on t (n)", 0), 0);
-    std::array<int, 4> numbers{7, 1, 2, 1};
-    ASSERT_EQ(Parse("insert into t values (:n, null)"), 0);
-    ASSERT_EQ(Bind("n", numbers.data(), 4, SQLT_INT), 0);
-    EXPECT_EQ(oexn(&cda, 4, 1), 1);    // the third of its rows
-    EXPECT_EQ(cda.rpc, 2u);
 }
 
 TEST_F(LegacyCalls, ValuesGoInPieces) {
@@ -278,7 +243,6 @@ TEST_F(LegacyCalls, ValuesGoInPieces) {
     dvoid* told = nullptr;
     ub4 iteration = 9, index = 9, length = 3;
     ASSERT_EQ(Parse("insert into t values (1, :c)"), 0);
-    EXPECT_EQ(ogetpi(&cda, &piece, &told, nullptr, nullptr), 24370);
     const auto bind = [&](ub1 opcode, sb4 skip = 0) {
         return obindps(&cda, opcode, T(":c"), -1, reinterpret_cast<ub1*>(&context), 10, SQLT_CHR, -1, nullptr, nullptr,
                        nullptr, 0, 0, 0, skip, 0, nullptr, nullptr, -1, -1);
@@ -319,8 +283,6 @@ TEST_F(LegacyCalls, ValuesGoInPieces) {
 TEST_F(LegacyCalls, TextsOfNumbers) {
     std::array<text, 512> message{};
     const auto* const words = reinterpret_cast<const char*>(message.data());
-    EXPECT_EQ(oermsg(-1403, message.data()), 0);
-    EXPECT_STREQ(words, "[KELP/CLIENT] ORA-01403: no data found\n");
     EXPECT_EQ(Parse("select x from t", 0), 904);
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 512), 0);
     const char* const told = server ? "column \"x\" does not exist" : "no such column: x";
@@ -356,8 +318,7 @@ TEST_F(LegacyCalls, PartsOfLongValues) {
     }
     EXPECT_EQ(oflng(&cda, 2, nullptr, 0, 8, nullptr, 0), 0);
     const struct { sword position; sb4 offset, room; sword type, result; } kRefused[] = {
-        {1, 0, 4, 8, 932}, {0, 0, 4, 8, 1007}, {4, 0, 4, 8, 1007}, {70000, 0, 4, 8, 1007}, {2, -1, 4, 8, 1025},
-        {2, 0, -1, 8, 1025}, {2, 0, 4, 3, 1024}, {2, 0, 4, 112, 1024}};
+        {0, 0, 4, 8, 1007}, {4, 0, 4, 8, 1007}, {2, -1, 4, 8, 1025}, {2, 0, -1, 8, 1025}, {2, 0, 4, 112, 1024}};
     for (const auto& c : kRefused) EXPECT_EQ(read(c.position, c.offset, c.room, c.type), c.result) << c.position;
     EXPECT_EQ(cda.fc, 58);
     EXPECT_EQ(ofetch(&cda), 0);
@@ -374,15 +335,12 @@ TEST_F(LegacyCalls, PartsOfLongValues) {
 TEST_F(LegacyCalls, ExecutesThatFailUndoARowOrAll) {
     ASSERT_EQ(Run("create unique index u on t (n)"), 0);
     ASSERT_EQ(Run("insert into t values (9, null)"), 0);
-    for (const auto& [rollback, wait] : {std::pair{1, 0}, {3, 0}, {2, 1}, {2, 3}, {-1, 4}}) {
-        EXPECT_EQ(oopt(&cda, rollback, wait), 1025);
-    }
-    std::array<int, 4> numbers{1, 2, 1, 3};
+    std::array<int, 5> numbers{7, 1, 2, 1, 3};    // of which the first is passed over
     const auto insert = [&](sword rollback) {
         EXPECT_EQ(Parse("insert into t values (:n, null)"), 0);
         EXPECT_EQ(oopt(&cda, rollback, 0), 0);
         EXPECT_EQ(Bind("n", numbers.data(), 4, SQLT_INT), 0);
-        return oexn(&cda, 4, 0);
+        return oexn(&cda, 5, 1);
     };
     EXPECT_EQ(insert(0), 1);
     EXPECT_EQ(cda.rpc, 0u);
@@ -393,7 +351,7 @@ TEST_F(LegacyCalls, ExecutesThatFailUndoARowOrAll) {
     EXPECT_EQ(orol(&lda), 0);
     EXPECT_EQ(insert(0), 1);    // the first of its transaction
     EXPECT_EQ(orol(&lda), 0);
-    numbers[2] = 4;
+    numbers[3] = 4;
     EXPECT_EQ(ocon(&lda), 0);
     EXPECT_EQ(insert(0), 0);
     EXPECT_EQ(cda.rpc, 4u);
@@ -512,16 +470,13 @@ protected:
 TEST_F(LegacyBridges, ALoginBecomesAContext) {
     Fill(3);
     ASSERT_EQ(onbset(&lda), 0);
-    EXPECT_EQ(OCILdaToSvcCtx(&none, err, &unknown), OCI_INVALID_HANDLE);
     EXPECT_EQ(OCILdaToSvcCtx(&none, err, &cda), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCILdaToSvcCtx(&none, nullptr, &lda), OCI_INVALID_HANDLE);
     EXPECT_EQ(Number(OCILdaToSvcCtx(nullptr, err, &lda)), 21560);
     EXPECT_EQ(lda.rc, 21560);
     OCISvcCtx* taken = nullptr;
     ASSERT_EQ(OCILdaToSvcCtx(&taken, err, &lda), OCI_SUCCESS);
     EXPECT_EQ(lda.rc, 0);
     EXPECT_EQ(ocom(&lda), 1001);
-    EXPECT_EQ(oexec(&cda), 1001);
     EXPECT_EQ(CountOn(taken), 3);
     ub1 mode = 0;
     EXPECT_EQ(OCIAttrGet(taken, OCI_HTYPE_SVCCTX, &mode, nullptr, OCI_ATTR_NONBLOCKING_MODE, err), 0);
@@ -550,12 +505,10 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
     auto* const idle = static_cast<OCISvcCtx*>(New(OCI_HTYPE_SVCCTX));
     EXPECT_EQ(Number(OCISvcCtxToLda(idle, err, &unknown)), 3114);
     EXPECT_EQ(unknown.rc, 3114);
-    EXPECT_EQ(OCISvcCtxToLda(nullptr, err, &lent), OCI_INVALID_HANDLE);
     ASSERT_EQ(name(&service), 0);
     if (!server) {
         ASSERT_EQ(ExecuteOn(service, "create table t (n integer, c varchar2(10))"), 0);
     }
-    EXPECT_EQ(Number(OCISvcCtxToLda(service, err, nullptr)), 21560);
     EXPECT_EQ(Number(OCISvcCtxToLda(service, err, &lda)), 1015);
     ASSERT_EQ(ExecuteOn(service, "insert into t values (1, null)"), 0);
     ASSERT_EQ(OCISvcCtxToLda(service, err, &lent), 0);
@@ -573,17 +526,10 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
     ub1 current = 9;
     EXPECT_EQ(OCIAttrGet(service, OCI_HTYPE_SVCCTX, &current, nullptr, OCI_ATTR_IN_V8_MODE, err), 0);
     EXPECT_EQ(current, 0);
-    EXPECT_EQ(ologof(&lent), 1010);
     Cda_Def cursor{};
-    int count = 0;
     ASSERT_EQ(oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1), 0);
     ASSERT_EQ(oparse(&cursor, T("insert into t values (2, null)"), -1, 1, 2), 0);
     EXPECT_EQ(oexec(&cursor), 0);
-    ASSERT_EQ(oparse(&cursor, T("select count(*) from t"), -1, 1, 2), 0);
-    ASSERT_EQ(odefin(&cursor, 1, reinterpret_cast<ub1*>(&count), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1, nullptr,
-                     nullptr), 0);
-    EXPECT_EQ(oexfet(&cursor, 1, 0, 0), 0);
-    EXPECT_EQ(count, 2);
     OCISvcCtx* back = nullptr;
     EXPECT_EQ(OCILdaToSvcCtx(&back, err, &lent), 0);
     EXPECT_EQ(back, service);
@@ -602,7 +548,6 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
     }
     EXPECT_EQ(OCIHandleFree(service, OCI_HTYPE_SVCCTX), 0);
     EXPECT_EQ(oexec(&cursor), 1001);
-    EXPECT_EQ(ocom(&lent), 1001);
 }
 
 // What an engine can leave unfinished is repeated until it is done; the embedded one ends every call.
@@ -616,14 +561,9 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
         return result;
     };
     int value = 0;
-    if (server) {
-        ASSERT_EQ(Parse("select n from (select 7 as n, pg_sleep(0.3)) s"), 0);
-    } else {
-        ASSERT_EQ(Parse("select max(n) + 2 from t"), 0);
-    }
+    ASSERT_EQ(Parse(server ? "select n from (select 7 as n, pg_sleep(0.3)) s" : "select max(n) + 2 from t"), 0);
     ASSERT_EQ(Define(1, &value, 4, SQLT_INT), 0);
-    sword result = oexec(&cda);
-    EXPECT_EQ(result, server ? 3123 : 0);
+    EXPECT_EQ(oexec(&cda), server ? 3123 : 0);
     if (server) {
         Cda_Def other{};
         EXPECT_EQ(cda.v2_rc, -3123);
@@ -633,8 +573,6 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
         EXPECT_EQ(oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1), 3127) << "which would close it";
         EXPECT_EQ(oopen(&other, &lda, nullptr, -1, -1, nullptr, -1), 3127);
         for (auto* call : {ocom, orol, ologof, onbclr, onbtst}) EXPECT_EQ(call(&lda), 3127);
-        OCISvcCtx* none = nullptr;
-        EXPECT_EQ(OCILdaToSvcCtx(&none, nullptr, &lda), OCI_INVALID_HANDLE);
         EXPECT_EQ(finish([&] { return oexec(&cda); }), 0);
         EXPECT_GT(waits, 5);
     }
@@ -653,8 +591,8 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
     ASSERT_EQ(Bind("n", &number, 4, SQLT_INT), 0);
     EXPECT_EQ(finish([&] { return oexn(&cda, 1, 0); }), 0);
     EXPECT_EQ(cda.rpc, 2u);
-    ASSERT_EQ(Parse("select 1 / 0 from t"), 0);
     if (!server) return;
+    ASSERT_EQ(Parse("select 1 / 0 from t"), 0);
     EXPECT_EQ(finish([&] { return oexec(&cda); }), 1476);
     // A login whose connection is lost with its work ends all the same.
     ASSERT_EQ(Parse("delete from t where pg_terminate_backend(pg_backend_pid())"), 0);
@@ -686,11 +624,6 @@ TEST_F(LegacyCalls, ABreakEndsTheCallOnce) {
         ASSERT_EQ(onbclr(&lda), 0);
         EXPECT_EQ(One("select count(*) from t"), 1);
     }
-    // Where none runs, the next one.
-    EXPECT_EQ(obreak(&lda), 0);
-    ASSERT_EQ(Parse("select n from t"), 0);
-    EXPECT_EQ(oexec(&cda), 1013);
-    EXPECT_EQ(oexec(&cda), 0);
 }
 
 // Logins share nothing.
