@@ -86,8 +86,7 @@ TEST_P(Contract, ValuesComeBackAsTheyWent) {
                       "time 2024-02-29 13:14:15.123456;";
     EXPECT_EQ(Query("select * from v"), row);
     EXPECT_EQ(Query("select * from v where i = %1 and n = %2 and m = %3", {values[0], values[2], values[5]}), row);
-    ASSERT_EQ(Run("delete from v"), 0);
-    ASSERT_EQ(Run("insert into v values(%1, %2, %3, %4, %5, %6)", std::vector<Datum>(6)), 0);
+    MUST(Run("delete from v"), Run("insert into v values(%1, %2, %3, %4, %5, %6)", std::vector<Datum>(6)));
     EXPECT_EQ(Query("select * from v"), "null,null,null,null,null,null;");
 }
 
@@ -257,8 +256,7 @@ TEST_P(Contract, WhatAStatementDoesBeginsAndEndsTransactions) {
 
     EXPECT_EQ(Run("savepoint here"), 0);
     EXPECT_TRUE(connection_->InTransaction());
-    EXPECT_EQ(Run("insert into t values(5)"), 0);
-    EXPECT_EQ(Run("rollback to savepoint here"), 0);
+    SHOULD(Run("insert into t values(5)"), Run("rollback to savepoint here"));
     EXPECT_EQ(Count(), "5;");
     ASSERT_EQ(Answer(connection_->Commit()), 0);
     EXPECT_FALSE(connection_->InTransaction());
@@ -302,16 +300,13 @@ TEST_P(Contract, MarksNest) {
     MakeNumbers(1);
     ASSERT_EQ(Answer(connection_->SetMark()), 0);
     EXPECT_TRUE(connection_->InTransaction());
-    EXPECT_EQ(Run("insert into t values(2)"), 0);
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    EXPECT_EQ(Run("insert into t values(3)"), 0);
+    MUST(Run("insert into t values(2)"), Answer(connection_->SetMark()), Run("insert into t values(3)"));
     ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
     EXPECT_EQ(All(), "1;2;");
     EXPECT_EQ(Run("insert into t values(4)"), 0);
     ASSERT_EQ(Answer(connection_->UndoToMark()), 0) << "the mark stays";
     EXPECT_EQ(All(), "1;2;");
-    EXPECT_EQ(Run("insert into t values(5)"), 0);
-    ASSERT_EQ(Answer(connection_->DropMark()), 0);
+    MUST(Run("insert into t values(5)"), Answer(connection_->DropMark()));
     EXPECT_EQ(All(), "1;2;5;");
     ASSERT_EQ(Answer(connection_->UndoToMark()), 0) << "to the outer mark";
     EXPECT_EQ(All(), "1;");
@@ -319,8 +314,7 @@ TEST_P(Contract, MarksNest) {
     EXPECT_EQ(Answer(connection_->DropMark()), 1086);
     EXPECT_EQ(Answer(connection_->UndoToMark()), 1086);
     EXPECT_TRUE(connection_->InTransaction());
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MUST(Answer(connection_->SetMark()), Answer(connection_->Commit()));
     EXPECT_EQ(Answer(connection_->UndoToMark()), 1086) << "the end of the transaction forgets them";
 }
 
@@ -332,8 +326,7 @@ TEST_P(Contract, ReadOnlyTransactionRefusesChangesAndSeesWhatThereWas) {
         EXPECT_TRUE(connection_->InTransaction());
         EXPECT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0) << "does nothing";
         if (other) {
-            EXPECT_EQ(Run(*other, "insert into t values(4)"), 0);
-            EXPECT_EQ(Answer(other->Commit()), 0);
+            SHOULD(Run(*other, "insert into t values(4)"), Answer(other->Commit()));
         }
         EXPECT_EQ(All(), "1;2;3;");
         if (mode == TransactionMode::read_only) {
@@ -354,16 +347,14 @@ TEST_P(SharedContract, SerializableChangeBehindOthersIsRefused) {
     const auto other = Connect();
     ASSERT_EQ(Answer(connection_->Begin(TransactionMode::serializable)), 0);
     EXPECT_EQ(All(), "1;2;3;");
-    EXPECT_EQ(Run(*other, "update t set n = 30 where n = 3"), 0);
-    EXPECT_EQ(Answer(other->Commit()), 0);
+    SHOULD(Run(*other, "update t set n = 30 where n = 3"), Answer(other->Commit()));
     EXPECT_EQ(Run("update t set n = 31 where n = 3"), 8177);
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
     EXPECT_EQ(All(), "1;2;30;");
 }
 
 TEST_P(Contract, DefinitionEndsAReadOnlyTransaction) {
-    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_only)), 0);
-    EXPECT_EQ(Run("create table t(n integer)"), 0);
+    MUST(Answer(connection_->Begin(TransactionMode::read_only)), Run("create table t(n integer)"));
     EXPECT_FALSE(connection_->InTransaction());
 }
 
@@ -374,8 +365,7 @@ TEST_P(SharedContract, LockedRowsAnswerAfterAWhile) {
     EXPECT_EQ(Run("update t set n = n + 2"), 54);
     EXPECT_FALSE(connection_->InTransaction());
     EXPECT_EQ(All(), "1;2;3;") << "readers go on";
-    ASSERT_EQ(Answer(other->Rollback()), 0);
-    EXPECT_EQ(Run("update t set n = n + 2"), 0);
+    MUST(Answer(other->Rollback()), Run("update t set n = n + 2"));
 }
 
 TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
@@ -404,8 +394,7 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
         bool kept[] = {false, false, true};
         EXPECT_EQ(Answer(other->KeepsPrepared(xid, kept[0])), 0);
         ASSERT_EQ(Run(*other, "deallocate all"), 0);           // the engine's own statements, too
-        EXPECT_EQ(Answer(other->KeepsPrepared(xid, kept[1])), 0);
-        EXPECT_EQ(Answer(other->KeepsPrepared({.format = 1}, kept[2])), 0);
+        SHOULD(Answer(other->KeepsPrepared(xid, kept[1])), Answer(other->KeepsPrepared({.format = 1}, kept[2])));
         EXPECT_TRUE(kept[0] && kept[1] && !kept[2]);
         prepared.clear();
         for (const std::string name : others) server_->RunHere("begin; select pg_current_xact_id(); prepare transaction '" + name + "'");
@@ -422,8 +411,7 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
         xid.data[127] = 0;
         ASSERT_EQ(Run("insert into t values(2)"), 0);
     }
-    ASSERT_EQ(Answer(connection_->Rollback()), 0);
-    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
+    MUST(Answer(connection_->Rollback()), Answer(connection_->Begin(TransactionMode::read_write)));
     EXPECT_EQ(All(), "1;");
     ASSERT_EQ(Answer(connection_->Prepare(xid, read_only)), 0);
     EXPECT_TRUE(read_only) << "nothing was changed";
@@ -506,8 +494,7 @@ TEST_P(Contract, OpenQueryDeliversTheRowsThatThereWereWhenItWasOpened) {
         {"a rollback of its own rows", [&] { EXPECT_EQ(Answer(connection_->Rollback()), 0); }},
         {"an undo of its own rows",
          [&] {
-             EXPECT_EQ(Answer(connection_->UndoToMark()), 0);
-             EXPECT_EQ(Answer(connection_->DropMark()), 0);
+             SHOULD(Answer(connection_->UndoToMark()), Answer(connection_->DropMark()));
          }},
         {"a savepoint's undo", [&] { EXPECT_EQ(Run("rollback to savepoint here"), 0); }},
         {"a later query", [&] { EXPECT_EQ(Count(), "3;"); }},
@@ -538,8 +525,7 @@ TEST_P(SharedContract, OpenQueryNeitherHindersNorSeesAnotherSession) {
     const auto other = Connect();
     const auto open = Opened("select n from t order by n");
     ASSERT_EQ(Fetched(*open, 1), "1;");
-    EXPECT_EQ(Run(*other, "insert into t values(4)"), 0);
-    EXPECT_EQ(Answer(other->Commit()), 0);
+    SHOULD(Run(*other, "insert into t values(4)"), Answer(other->Commit()));
     EXPECT_EQ(Count(), "4;") << "a query begun later sees it";
     EXPECT_EQ(Run("update t set n = n + 10"), 0) << "a write after a stale read";
     EXPECT_EQ(Rest(*open), "2;3;");
@@ -652,16 +638,13 @@ TEST_P(Contract, RequestStopsAnArrayThatTriesAllRows) {
 
 TEST_P(Contract, WhatEndsOrUndoesLooksAtNoRequest) {
     MakeNumbers(1);
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    ASSERT_EQ(Run("insert into t values(2)"), 0);
+    MUST(Answer(connection_->SetMark()), Run("insert into t values(2)"));
     const char* many = "with recursive r(n) as (select 1 union all select n + 1 from r where n < 20000) "
                        "select r.n, t.n from r, t where r.n > 19999 order by t.n";
     const auto undone = Opened(many);
     const auto rolled_back = Opened(many);
     stop_->Ask();
-    EXPECT_EQ(Answer(connection_->UndoToMark()), 0);
-    EXPECT_EQ(Answer(connection_->DropMark()), 0);
-    EXPECT_EQ(Answer(connection_->Rollback()), 0);
+    SHOULD(Answer(connection_->UndoToMark()), Answer(connection_->DropMark()), Answer(connection_->Rollback()));
     EXPECT_TRUE(stop_->Take());
     EXPECT_EQ(Rest(*undone), "20000,1;20000,2;") << "rows that an undo must keep for a query are read whole";
     EXPECT_EQ(Rest(*rolled_back), "20000,1;20000,2;");
@@ -697,8 +680,7 @@ TEST_P(Contract, UndoIsWholeHoweverOftenStopsAreAskedFor) {
         stopped += failure != 0;
         ASSERT_TRUE(connection_->InTransaction() || failure != 0);
         if (connection_->InTransaction()) {
-            ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
-            ASSERT_EQ(Answer(connection_->DropMark()), 0);
+            MUST(Answer(connection_->UndoToMark()), Answer(connection_->DropMark()));
         }
         ASSERT_EQ(Answer(connection_->Commit()), 0);
     }
@@ -752,8 +734,7 @@ TEST_P(Contract, RefusedUserLosesNothing) {
 
 TEST_P(Contract, PasswordChangeIsForGood) {
     connection_.reset();
-    ASSERT_EQ(LogOn(owner_, "secret"), 0);
-    ASSERT_EQ(Answer(database_->Connect({owner_, "secret", false}, stop_, connection_)), 0);
+    MUST(LogOn(owner_, "secret"), Answer(database_->Connect({owner_, "secret", false}, stop_, connection_)));
     const struct { std::string user, old_password, new_password; int number; } refused[] = {
         {owner_, "wrong", "new", 28008}, {owner_, std::string("secret\0x", 8), "new", 28008}, {"bob", "secret", "new", 1017},
         {owner_, "secret", std::string("a\0b", 3), 1017}};
@@ -926,8 +907,7 @@ protected:
             EXPECT_EQ(Answer(query->ExecuteArray(none, {0, 1, false, &rows}, outcome)), 0);
         } else {
             bool more = true;
-            EXPECT_EQ(Answer(query->Open(none, {})), 0);
-            EXPECT_EQ(Answer(query->Fetch(rows, 100, more)), 0);
+            SHOULD(Answer(query->Open(none, {})), Answer(query->Fetch(rows, 100, more)));
         }
         EXPECT_EQ(rows.number, 0);
         return rows.lobs.empty() ? nullptr : rows.lobs.front();
@@ -1003,18 +983,14 @@ TEST_P(LobContract, ItsRowIsKnownHoweverTheTableIsNamed) {
 
 TEST_P(LobContract, WritesGoWithTheTransactionAndItsMarks) {
     Kept lob = Locked();
-    ASSERT_EQ(Write(*lob, 5, "-first"), 0);
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    ASSERT_EQ(Write(*lob, 11, "-second"), 0);
+    MUST(Write(*lob, 5, "-first"), Answer(connection_->SetMark()), Write(*lob, 11, "-second"));
     ASSERT_EQ(Write(*lob, 0, "T"), 0);
     EXPECT_EQ(Run("rollback to savepoint nosuch"), 1086);      // undoes nothing, what waits to be stored neither
     EXPECT_EQ(Read(*lob), "Three-first-second");
     ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
     EXPECT_EQ(Read(*lob), "three-first");
     EXPECT_EQ(Stored(), "1,one;3,three-first;");
-    ASSERT_EQ(Write(*lob, 0, "T"), 0);
-    ASSERT_EQ(Write(*lob, 11, "!"), 0);
-    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    MUST(Write(*lob, 0, "T"), Write(*lob, 11, "!"), Answer(connection_->Rollback()));
     EXPECT_EQ(Stored(), "1,one;3,three;");
 }
 
@@ -1041,8 +1017,7 @@ TEST_P(LobContract, OneThatIsNotLockedIsReadOnlyAndWhatItWas) {
 
 TEST_P(LobContract, RowThatIsGoneHasNoValue) {
     Kept lob = Locked();
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    ASSERT_EQ(Run("update l set c = null where k = 3"), 0);
+    MUST(Answer(connection_->SetMark()), Run("update l set c = null where k = 3"));
     EXPECT_EQ(Read(*lob), "error 22922");
     ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
     EXPECT_EQ(Read(*lob), "three");
@@ -1067,9 +1042,7 @@ TEST_P(LobContract, OpenQueryKeepsItsValuesWhileOthersAreWritten) {
     ::Rows none;
     Taking rows(*connection_->Lobs());
     bool more = true;
-    ASSERT_EQ(Answer(query->Open(none, {})), 0);
-    ASSERT_EQ(Answer(query->Fetch(rows, 1, more)), 0);
-    ASSERT_EQ(Write(*rows.lobs[0], 3, " more"), 0);
+    MUST(Answer(query->Open(none, {})), Answer(query->Fetch(rows, 1, more)), Write(*rows.lobs[0], 3, " more"));
     ASSERT_EQ(Answer(query->Fetch(rows, 10, more)), 0);
     ASSERT_EQ(rows.lobs.size(), 2u);
     EXPECT_EQ(Read(*rows.lobs[0]) + Read(*rows.lobs[1]), "one morethree");
@@ -1089,8 +1062,7 @@ TEST_P(LobContract, LongOnesAreReadAndWrittenInPieces) {
     ASSERT_EQ(Run("update l set k = 7 where k = 3"), 0);       // the draft is stored first
     ASSERT_EQ(Write(*lob, 4'000'000, "HERE"), 0);
     text.replace(4'000'000, 4, "HERE");
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    ASSERT_EQ(Answer(lob->Trim(3)), 0);
+    MUST(Answer(connection_->SetMark()), Answer(lob->Trim(3)));
     EXPECT_EQ(Query("select length(c) from l where k = 7"), "2;");
     ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
     EXPECT_TRUE(lob->IsSame(*Locked("select c from l where k = 7")));
@@ -1112,8 +1084,7 @@ TEST_P(LobContract, LongOnesAreReadAndWrittenInPieces) {
 
 TEST_P(LobContract, LongOnesAreReadWhileTheirRowsCome) {
     const std::string text(100'000, 'x');
-    ASSERT_EQ(Run("update l set c = %1 where c is not null", {Text(text)}), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MUST(Run("update l set c = %1 where c is not null", {Text(text)}), Answer(connection_->Commit()));
     struct : engine::RowSink {
         engine::LobStore* store = nullptr;
         std::string seen;
@@ -1183,8 +1154,7 @@ TEST_P(ServerObjects, AreWrittenWhereTheyLie) {
     EXPECT_EQ(Write(*Plain("select c from o where k = 3"), 0, "x"), 22920);
     EXPECT_EQ(Write(*Plain("select o.c from o, l where o.k = 3"), 0, "x"), 22920);
     const Kept lob = Locked("select c from o where k = 3");
-    ASSERT_EQ(Write(*lob, 0, "TH"), 0);
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
+    MUST(Write(*lob, 0, "TH"), Answer(connection_->SetMark()));
     ASSERT_EQ(Write(*lob, 7, " more"), 0);                     // behind a gap
     EXPECT_EQ(Read(*lob), std::string("THree\0\0 more", 12));
     EXPECT_EQ(Read(*lob, 3) + Read(*lob, 12) + Read(*lob, 1'000'000), std::string("ee\0\0 more", 9));

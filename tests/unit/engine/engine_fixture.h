@@ -18,6 +18,7 @@
 #include "engine/engine.h"
 #include "number/number.h"
 #include "oci.h"
+#include "support/must.h"
 
 using engine::Datum;
 using engine::Effect;

@@ -102,8 +102,7 @@ TEST_F(Postgres, ServerThatCannotBeReached) {
 TEST_F(Postgres, SchemaIsTheSessionsOwn) {
     for (const char* sql : {"create schema s", "create table t(n integer)", "create table s.t(n integer)"})
         ASSERT_EQ(Run(sql), 0) << sql;
-    ASSERT_EQ(Run("insert into s.t values(7)"), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MustCommit("insert into s.t values(7)");
     ASSERT_EQ(Answer(connection_->SetMark()), 0);
     std::string schema = "s";
     ASSERT_EQ(Answer(connection_->UseSchema(schema)), 0);
@@ -123,9 +122,7 @@ TEST_F(Postgres, SchemaIsTheSessionsOwn) {
 
 // At each call: 3113 first, 3114 then, whatever was open; and a new logon works.
 TEST_F(Postgres, ServerThatGoesAway) {
-    ASSERT_EQ(Run("create table t(n integer)"), 0);
-    ASSERT_EQ(Run("insert into t select generate_series(1, 3000)"), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MustCommit("create table t(n integer)", "insert into t select generate_series(1, 3000)");
     engine::ArrayOutcome outcome;
     Rows one{{Integer(1)}}, many;
     many.rows.assign(20, {Integer(1)});
@@ -146,8 +143,7 @@ TEST_F(Postgres, ServerThatGoesAway) {
         {"prepare", [&] { return connection_->Prepare({.format = 1}, flag); }}};
     for (const auto& [name, call] : calls) {
         insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
-        ASSERT_EQ(Execute(*insert, many, {.first = 0, .last = 20}), 0);
-        ASSERT_EQ(Answer(connection_->Rollback()), 0);
+        MUST(Execute(*insert, many, {.first = 0, .last = 20}), Answer(connection_->Rollback()));
         query = Opened("select n from t");
         const bool in_transaction = name[0] == 'c' || name[0] == 'r' || name[0] == 'p';
         if (in_transaction) { ASSERT_EQ(Run("delete from t where n = 1"), 0); }
@@ -199,12 +195,9 @@ TEST_F(Postgres, StopIsHeededBehindSignals) {
 }
 
 TEST_F(Postgres, DeadlockUndoesOneStatement) {
-    ASSERT_EQ(Run("create table t(n integer, a integer)"), 0);
-    ASSERT_EQ(Run("insert into t values(1, 0), (2, 0)"), 0);
-    ASSERT_EQ(Answer(connection_->Commit()), 0);
+    MustCommit("create table t(n integer, a integer)", "insert into t values(1, 0), (2, 0)");
     const auto other = Connect(std::make_shared<engine::StopRequest>());
-    ASSERT_EQ(Run("update t set a = 1 where n = 1"), 0);
-    ASSERT_EQ(Run(*other, "update t set a = 2 where n = 2"), 0);
+    MUST(Run("update t set a = 1 where n = 1"), Run(*other, "update t set a = 2 where n = 2"));
     int theirs = 0;
     std::thread waiting([&] { theirs = Run(*other, "update t set a = 2 where n = 1"); });
     const int ours = Run("update t set a = 1 where n = 2");

@@ -160,8 +160,7 @@ TEST_F(SqliteMeaning, ChangesFindTheRowsThatAQueryFinds) {
         MustRun("create view y as select id from t where " + literal);
         EXPECT_EQ(Rows("select id from w"), c.id) << literal;
         EXPECT_EQ(Rows("select id from y"), c.id) << literal;
-        MustRun("drop table w");
-        MustRun("drop view y");
+        MustRun("drop table w", "drop view y");
     }
     EXPECT_EQ(Rows("select count(*) as n from sqlite_schema where sql like '%kelp_compare%'"), "0;");
     MustRun("delete from t where d = '03-FEB-24'");
@@ -200,8 +199,7 @@ TEST_F(SqliteMeaning, LongStatementsTakeBoundedTime) {
 
 TEST_F(SqliteMeaning, ExpressionsKeepTheNamesThatTheyWereGiven) {
     MakeTables();
-    ASSERT_EQ(Prepare("select case when d = '03-FEB-24' then 1 end, c = 'ab ', id from t"), 0);
-    ASSERT_EQ(Execute(0), 0);
+    MUST(Prepare("select case when d = '03-FEB-24' then 1 end, c = 'ab ', id from t"), Execute(0));
     const char* names[] = {"CASE WHEN D = '03-FEB-24' THEN 1 END", "C = 'ab '", "ID"};
     for (ub4 position = 1; position <= std::size(names); ++position) {
         dvoid* parameter = nullptr;
@@ -326,8 +324,7 @@ TEST_F(SqliteDescribes, RowIdsByAnotherName) {
 }
 
 TEST_F(SqliteDescribes, NativeFloatsAndDoubles) {
-    MustRun("create table t(f binary_float, d binary_double)");
-    MustRun("insert into t values(16777217, 0.1)");
+    MustRun("create table t(f binary_float, d binary_double)", "insert into t values(16777217, 0.1)");
     const auto columns = Describe("select f, d, cast(f as binary_double) c from t");
     ASSERT_EQ(columns.size(), 3u);
     EXPECT_EQ(columns[0], (Described{"F", SQLT_IBFLOAT, 4, 0, 0, 0, false}));
@@ -406,8 +403,7 @@ TEST_F(SqliteMeaning, FractionsAreRoundedToTheColumnsDigits) {
         EXPECT_EQ(One("select cast(" + literal + " as " + c.type + ") || '' from dual"), c.kept) << c.type;
         MustRun("drop table t");
     }
-    MustRun("create table t(s timestamp(0))");
-    MustRun("insert into t values('2024-01-01 00:00:00')");
+    MustRun("create table t(s timestamp(0))", "insert into t values('2024-01-01 00:00:00')");
     EXPECT_EQ(Rows("select count(*) as n from t where s < '01-JAN-24 12.00.00.4 AM'"), "1;") << "what is compared is not";
 }
 
@@ -438,9 +434,8 @@ TEST_F(SqliteMeaning, DefaultsAreExpressions) {
         EXPECT_EQ(kept, c.kept[0] == '!' ? c.kept : c.kept + std::string(";")) << column;
         if (error == 0) MustRun("drop table u");
     }
-    MustRun("create table u(id number)");
-    MustRun("alter table u add column d date default '09-FEB-24'");
-    MustRun("insert into u(id) values(1)");
+    MustRun("create table u(id number)", "alter table u add column d date default '09-FEB-24'",
+            "insert into u(id) values(1)");
     EXPECT_EQ(Rows("select d || '' as d from u"), "2024-02-09 00:00:00;");
 }
 
@@ -477,8 +472,7 @@ TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
         {"instr('abc', 'c', 4)", "0"}, {"'[' || decode(cast('   ' as char(3)), '   ', 'same') || ']'", "[same]"},
     };
     for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.value) << c.expression;
-    MustRun("create table t(c char(3))");
-    MustRun("insert into t select '   ' from dual");
+    MustRun("create table t(c char(3))", "insert into t select '   ' from dual");
     EXPECT_EQ(Rows("select '[' || c || ']' as x, length(c) as n from t where c is not null"), "[ ],1;");
     EXPECT_EQ(Rows("select c from t"), "   ;");
 }
@@ -495,11 +489,8 @@ TEST_F(SqliteMeaning, ReplacedRowsReturnTheirObjects) {
     };
     for (const char* sql : {"insert or replace into l values(1, 'nee') returning c into :1",
                             "replace into l values(1, 'nee') returning c into :1"}) {
-        ASSERT_EQ(Query("select c from l for update", {{&old, -1, SQLT_CLOB}}), 0);
-        EXPECT_EQ(write(old), 0);
-        ASSERT_EQ(Ready(sql, {{&lob, -1, SQLT_CLOB}}), 0);
-        EXPECT_EQ(Execute(), 0);
-        EXPECT_EQ(write(lob), 0);
+        MUST(Query("select c from l for update", {{&old, -1, SQLT_CLOB}}), write(old));
+        MUST(Ready(sql, {{&lob, -1, SQLT_CLOB}}), Execute(), write(lob));
         EXPECT_EQ(One("select c from l"), "new") << sql;
         EXPECT_EQ(write(old), 22922) << sql;
     }

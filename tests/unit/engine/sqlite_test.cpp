@@ -335,8 +335,7 @@ TEST_F(Sqlite, OpenQueryOutlivesItsTablesInATemporaryFile) {
     } sink;
     const auto open = Opened("select n, v from t order by n");
     bool more = false;
-    ASSERT_EQ(Answer(open->Fetch(sink, 1, more)), 0);
-    ASSERT_EQ(Run("drop table t"), 0);
+    MUST(Answer(open->Fetch(sink, 1, more)), Run("drop table t"));
     ASSERT_EQ(Answer(open->Fetch(sink, 100000, more)), 0) << "row " << sink.row;
     EXPECT_EQ(sink.row, 40000);
     EXPECT_FALSE(more);
@@ -346,8 +345,7 @@ TEST_F(Sqlite, AccountsAreNobodysBusiness) {
     EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "other")), 1017) << "no accounts";
     EXPECT_EQ(Run("create table KELP_accounts(name, password)"), 1031) << "nobody but the engine makes it";
     EXPECT_EQ(Run("create temp view kelp_accounts as select 'ANN' as name, '' as password"), 1031);
-    ASSERT_EQ(LogOn("ann", "secret"), 0);
-    ASSERT_EQ(Run("create table t(n integer)"), 0);
+    MUST(LogOn("ann", "secret"), Run("create table t(n integer)"));
     EXPECT_EQ(Query("select name from kelp_accounts"), "ANN;");
     for (const char* sql :
          {"update kelp_accounts set password = ''", "delete from kelp_accounts", "delete from Main.KELP_Accounts",
@@ -369,8 +367,7 @@ TEST_F(Sqlite, AccountsAreNobodysBusiness) {
     engine::ObjectDescription object;
     EXPECT_EQ(Answer(connection_->Describe("kelp_accounts", engine::ObjectKind::table, object)), 0);
 
-    ASSERT_EQ(Answer(connection_->Rollback()), 0);
-    EXPECT_EQ(LogOn("ann", "secret"), 0);
+    MUST(Answer(connection_->Rollback()), LogOn("ann", "secret"));
     sqlite3* file = nullptr;
     std::string hash;
     ASSERT_EQ(sqlite3_open((folder_ + "/test.db").c_str(), &file), SQLITE_OK);
@@ -480,8 +477,7 @@ TEST_F(Sqlite, FileThatCannotBeWrittenIsRead) {
         if (Query("select n from t") != "1;") return 6;
         return 0;
     };
-    ASSERT_EQ(chmod(file.c_str(), 0444), 0);
-    ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
+    MUST(chmod(file.c_str(), 0444), chmod(folder_.c_str(), 0555));
     EXPECT_EQ(AsNobody(look), 0) << "neither the file nor its folder";
     ASSERT_EQ(chmod(folder_.c_str(), 0777), 0);
     EXPECT_EQ(AsNobody(look), 0) << "the file";

@@ -314,8 +314,7 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     EXPECT_EQ(Member(root, &again, 1), 24334) << "no list";
     EXPECT_EQ(Member(root, &again, 1, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
     EXPECT_EQ(Member(describe, &again, 1, OCI_HTYPE_SERVER), 24316);
-    ASSERT_EQ(Run("drop view v", 1), 0);
-    ASSERT_EQ(Run("drop table t", 1), 0);
+    MUST(Run("drop view v", 1), Run("drop table t", 1));
     EXPECT_EQ(Name(root, OCI_ATTR_OBJ_NAME), "T") << "as it was";
     EXPECT_EQ(Describe(describe, Schema(), OCI_PTYPE_SCHEMA), 0);
     EXPECT_EQ(OCIDescriptorFree(columns, OCI_DTYPE_PARAM), OCI_INVALID_HANDLE) << "gone with what it described";
@@ -346,8 +345,7 @@ TEST_F(AttributesTest, CurrentSchema) {
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, own, OCI_CRED_EXT, OCI_DEFAULT)), 1435);
     EXPECT_EQ(Answer(OCISessionEnd(svc, err_, own, OCI_DEFAULT)), 1012) << "it did not begin";
     EXPECT_EQ(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_USERNAME, ann_.data(), Length(ann_.c_str())), 0);
-    EXPECT_EQ(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_PASSWORD, const_cast<char*>("secret"), 6), 0);
-    EXPECT_EQ(set(own, ann_.c_str()), 0);
+    SHOULD(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_PASSWORD, const_cast<char*>("secret"), 6), set(own, ann_.c_str()));
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, own, OCI_CRED_RDBMS, OCI_DEFAULT)), 0) << "the user's own";
 }
 

@@ -178,8 +178,7 @@ TEST_F(CallsTest, LongMessagesEndTheirLine) {
             const std::size_t longest = OCI_ERROR_MAXMSG_SIZE / unit - 1;
             EXPECT_EQ(line.size() == longest, length + 40 >= longest) << mode << ' ' << length << ": " << line.size();
         }
-        ASSERT_EQ(OCIFileTerm(env, err), OCI_SUCCESS);
-        EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+        MUST(OCIFileTerm(env, err), OCIHandleFree(env, OCI_HTYPE_ENV));
     }
 }
 
@@ -295,8 +294,7 @@ TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {
     EXPECT_EQ(Attribute<OCITrans*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS), transaction);
     EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
     EXPECT_EQ(OCIHandleFree(server, OCI_HTYPE_SERVER), OCI_ERROR) << "in use";
-    EXPECT_EQ(Answer(OCIBreak(svc, err_)), 0);
-    EXPECT_EQ(Answer(OCIReset(server, err_)), 0);
+    SHOULD(Answer(OCIBreak(svc, err_)), Answer(OCIReset(server, err_)));
 
     auto* second = New<OCISession>(OCI_HTYPE_SESSION);
     EXPECT_EQ(Answer(OCISessionBegin(svc, err_, second, OCI_CRED_EXT, 0)), 0) << "a further session on the server";
@@ -339,8 +337,7 @@ TEST_F(CallsTest, PasswordChange) {
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012) << "nor is the session left";
     EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 0);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 0) << "the change has begun a session";
-    EXPECT_EQ(change(other, "ann", "four", "five", 0), 0);
-    EXPECT_EQ(Answer(OCILogoff(other, err_)), 0);
+    SHOULD(change(other, "ann", "four", "five", 0), Answer(OCILogoff(other, err_)));
 }
 
 TEST_F(CallsTest, VersionsAreCutToTheBuffer) {
@@ -399,8 +396,7 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     EXPECT_EQ(Attribute<ub2>(env, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
     EXPECT_EQ(memory.out, 0);
-    ASSERT_EQ(OCITerminate(OCI_DEFAULT), OCI_SUCCESS);
-    ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
+    MUST(OCITerminate(OCI_DEFAULT), OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr));
     EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 0) << "forgotten";
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
     ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, OwnMemory::Allocate, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);

@@ -89,8 +89,7 @@ struct Struck : Objects {
 
     Struck() {
         Make("begin open :c for select 1 from dual; end;", &memory);
-        EXPECT_EQ(OCIStringAssignText(env, err, Text("a longer text"), 13, &source), OCI_SUCCESS);
-        EXPECT_EQ(Bind(), OCI_SUCCESS);
+        SHOULD(OCIStringAssignText(env, err, Text("a longer text"), 13, &source), Bind());
     }
     sword Bind() {
         OCIBind* bind = nullptr;
@@ -280,8 +279,7 @@ TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
         });
         in.join();
         working.join();
-        EXPECT_EQ(OCIHandleFree(elsewhere, OCI_HTYPE_ENV), OCI_SUCCESS);
-        EXPECT_EQ(OCIHandleFree(shared.env, OCI_HTYPE_ENV), OCI_SUCCESS);
+        SHOULD(OCIHandleFree(elsewhere, OCI_HTYPE_ENV), OCIHandleFree(shared.env, OCI_HTYPE_ENV));
         ASSERT_EQ(OCI_memGetMemCount(), before) << "round " << round;
     }
 }
@@ -344,20 +342,17 @@ TEST_F(BesideAWait, ForAThreadToEnd) {
 
 TEST_F(BesideAWait, ForAMutex) {
     OCIThreadMutex* mutex = nullptr;
-    ASSERT_EQ(OCIThreadMutexInit(env_, err_, &mutex), OCI_SUCCESS);
-    ASSERT_EQ(OCIThreadMutexAcquire(env_, err_, mutex), OCI_SUCCESS);
+    MUST(OCIThreadMutexInit(env_, err_, &mutex), OCIThreadMutexAcquire(env_, err_, mutex));
     MakeAndFree(
         [&] {
-            EXPECT_EQ(OCIThreadMutexAcquire(env_, wait_err_, mutex), OCI_SUCCESS);
-            EXPECT_EQ(OCIThreadMutexRelease(env_, wait_err_, mutex), OCI_SUCCESS);
+            SHOULD(OCIThreadMutexAcquire(env_, wait_err_, mutex), OCIThreadMutexRelease(env_, wait_err_, mutex));
         },
         [&] { EXPECT_EQ(OCIThreadMutexRelease(env_, err_, mutex), OCI_SUCCESS); });
 }
 
 TEST_F(BesideAWait, ForAPipe) {
     const std::string name = "/tmp/kelp-pipe-" + std::to_string(getpid());
-    ASSERT_EQ(mkfifo(name.c_str(), 0600), 0);
-    ASSERT_EQ(OCIFileInit(env_, err_), OCI_SUCCESS);
+    MUST(mkfifo(name.c_str(), 0600), OCIFileInit(env_, err_));
     OCIFileObject* file = nullptr;
     const int other_end = open(name.c_str(), O_RDWR);
     ASSERT_EQ(OCIFileOpen(env_, err_, &file, Text(name), nullptr, OCI_FILE_READ_ONLY, OCI_FILE_EXIST, OCI_FILE_BIN), 0);

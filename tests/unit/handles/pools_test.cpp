@@ -92,8 +92,7 @@ TEST_F(Pools, NumbersOfAPool) {
     EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "", "secret"), 24415);
     EXPECT_EQ(Create(1, 1, 1, kHomogeneous, nullptr, "wrong"), 1017);
     EXPECT_EQ(Destroy(), 24404);
-    ASSERT_EQ(Create(3, 3, 0, kHomogeneous | OCI_SPC_NO_RLB), 0);
-    EXPECT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
+    MUST(Create(3, 3, 0, kHomogeneous | OCI_SPC_NO_RLB), Create(1, 2, 1, OCI_SPC_REINITIALIZE));
     EXPECT_EQ(OpenCount(), 2u) << "what rests beyond the most is closed at once";
     EXPECT_EQ(Destroy(), 0);
     // Steps, a surplus that goes as it comes back, and a pool that shrinks and grows.
@@ -104,9 +103,7 @@ TEST_F(Pools, NumbersOfAPool) {
         ASSERT_EQ(Get(&svc[index], err_), 0);
         EXPECT_EQ(OpenCount(), open[index]) << index;
     }
-    EXPECT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
-    EXPECT_EQ(Release(svc[0]), 0);
-    EXPECT_EQ(Release(svc[1]), 0);
+    SHOULD(Create(1, 2, 1, OCI_SPC_REINITIALIZE), Release(svc[0]), Release(svc[1]));
     EXPECT_EQ(OpenCount(), 2u);
     EXPECT_EQ(Create(3, 3, 0, OCI_SPC_REINITIALIZE), 0);
     EXPECT_EQ(OpenCount(), 3u);
@@ -114,8 +111,7 @@ TEST_F(Pools, NumbersOfAPool) {
     EXPECT_EQ(Destroy(), 24422);
     EXPECT_EQ(OCIHandleFree(pool_, OCI_HTYPE_SPOOL), OCI_ERROR);
     EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24386);
-    EXPECT_EQ(Release(svc[2]), 0);
-    EXPECT_EQ(OCIHandleFree(svc[3], OCI_HTYPE_SVCCTX), OCI_SUCCESS);
+    SHOULD(Release(svc[2]), OCIHandleFree(svc[3], OCI_HTYPE_SVCCTX));
     EXPECT_EQ(OpenCount(), 2u) << "the freed context's is closed";
     EXPECT_EQ(OCIHandleFree(pool_, OCI_HTYPE_SPOOL), OCI_SUCCESS) << "destroys what is not in use";
 }
@@ -173,18 +169,15 @@ TEST_F(Pools, WhichSessionComes) {
 }
 
 TEST_F(Pools, SessionsOfSeveralUsers) {
-    ASSERT_EQ(Create(2, 2, 0, OCI_DEFAULT), 0);
-    EXPECT_EQ(Create(2, 2, 0, OCI_SPC_REINITIALIZE), 0);
+    MUST(Create(2, 2, 0, OCI_DEFAULT), Create(2, 2, 0, OCI_SPC_REINITIALIZE));
     EXPECT_EQ(OpenCount(), 0u) << "nobody knows whose";
     OCISvcCtx *svc = nullptr, *other = nullptr;
     ASSERT_EQ(Get(&svc, err_), 0) << "of the pool's own user, who becomes the database's owner";
     ASSERT_EQ(Release(svc), 0);
     EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "wrong")), 1017) << "one of hers rests, but not for him";
-    ASSERT_EQ(Create(0, 4, 3, OCI_SPC_REINITIALIZE), 0);
-    ASSERT_EQ(Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT), 0);
+    MUST(Create(0, 4, 3, OCI_SPC_REINITIALIZE), Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT));
     EXPECT_EQ(OpenCount(), 2u) << "nor for the system's user; steps are for the pool's own";
-    ASSERT_EQ(Create(0, 2, 1, OCI_SPC_REINITIALIZE), 0);
-    ASSERT_EQ(Get(&other, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0);
+    MUST(Create(0, 2, 1, OCI_SPC_REINITIALIZE), Get(&other, err_, kSpool, nullptr, User(ann_.c_str(), "secret")));
     EXPECT_EQ(OpenCount(), 2u);
     ASSERT_EQ(Release(svc), 0);
     ASSERT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0) << "the system user's makes room";
@@ -217,8 +210,7 @@ TEST_F(Pools, WhatAFullPoolAnswers) {
     EXPECT_EQ(Release(second), 0);
     EXPECT_EQ(OpenCount(), 1u);
     // The idle go when somebody looks, down to the least.
-    ASSERT_EQ(Release(svc), 0);
-    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1), 0);
+    MUST(Release(svc), Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1));
     EXPECT_EQ(OpenCount(), 1u);
     std::this_thread::sleep_for(1100ms);
     EXPECT_EQ(OpenCount(), 0u);
@@ -227,10 +219,8 @@ TEST_F(Pools, WhatAFullPoolAnswers) {
     ASSERT_EQ(Release(svc), 0);
     std::this_thread::sleep_for(1100ms);
     EXPECT_EQ(OpenCount(), 2u) << "no fewer than the least";
-    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 0), 0);
-    ASSERT_EQ(Create(1, 2, 1, OCI_SPC_REINITIALIZE), 0);
-    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1), 0);
-    ASSERT_EQ(Release(second), 0);
+    MUST(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 0), Create(1, 2, 1, OCI_SPC_REINITIALIZE));
+    MUST(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1), Release(second));
     EXPECT_EQ(OpenCount(), 1u) << "that which rested long, though the other has just come";
 }
 
@@ -244,31 +234,22 @@ TEST_F(Pools, WhatASessionLeaves) {
     };
     ASSERT_EQ(Get(&svc, err_), 0);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
-    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
-    ASSERT_EQ(Run(svc, "insert into t values(1)"), 0);
-    ASSERT_EQ(prepare(&stmt), 0);
+    MUST(Run(svc, "create table t(n number)"), Run(svc, "insert into t values(1)"), prepare(&stmt));
     ASSERT_EQ(Answer(OCIStmtExecute(svc, stmt, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
-    ASSERT_EQ(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), 0);
-    ASSERT_EQ(prepare(&again), 0);
+    MUST(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), prepare(&again));
     EXPECT_EQ(again, stmt);
-    ASSERT_EQ(Answer(OCIStmtRelease(again, err_, nullptr, 0, OCI_DEFAULT)), 0);
-    ASSERT_EQ(Answer(OCIBreak(svc, err_)), 0);
-    ASSERT_EQ(Release(svc), 0);
+    MUST(Answer(OCIStmtRelease(again, err_, nullptr, 0, OCI_DEFAULT)), Answer(OCIBreak(svc, err_)), Release(svc));
 
-    ASSERT_EQ(Get(&svc, err_), 0);
-    ASSERT_EQ(prepare(&again), 0);
+    MUST(Get(&svc, err_), prepare(&again));
     EXPECT_EQ(again, stmt) << "the cache stays with the connection";
     EXPECT_EQ(Answer(OCIStmtExecute(svc, again, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0) << "1013 is not its";
     ASSERT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 24374);
-    ASSERT_EQ(Run(svc, "insert into t values(2)"), 0);
-    ASSERT_EQ(Release(svc), 0);
+    MUST(Run(svc, "insert into t values(2)"), Release(svc));
     EXPECT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 3114) << "its session is over";
 
-    ASSERT_EQ(Get(&svc, err_), 0);
-    EXPECT_EQ(Run(svc, "create unique index i on t(n)"), 0);
+    MUST(Get(&svc, err_), Run(svc, "create unique index i on t(n)"));
     EXPECT_EQ(Run(svc, "insert into t values(2)"), 1) << "the release has committed";
-    ASSERT_EQ(Run(svc, "insert into t values(3)"), 0);
-    EXPECT_EQ(Destroy(OCI_SPD_FORCE), 0);
+    MUST(Run(svc, "insert into t values(3)"), Destroy(OCI_SPD_FORCE));
     EXPECT_EQ(Run(svc, "insert into t values(4)"), 1012);
     EXPECT_EQ(Release(svc), 1012);
     EXPECT_EQ(Release(svc), OCI_INVALID_HANDLE) << "the context has gone all the same";
@@ -279,9 +260,7 @@ TEST_F(Pools, WhatASessionLeaves) {
     ASSERT_EQ(Release(svc, OCI_SESSRLS_DROPSESS), 0);
     EXPECT_EQ(OpenCount(), 0u);
     for (const auto& [size, mode, cache] : {std::tuple(0u, kHomogeneous, 0u), {7u, kHomogeneous | OCI_SPC_STMTCACHE, 7u}}) {
-        ASSERT_EQ(Destroy(), 0);
-        ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_STMTCACHESIZE, size), 0);
-        ASSERT_EQ(Create(0, 1, 1, mode), 0);
+        MUST(Destroy(), Set<ub4>(OCI_ATTR_SPOOL_STMTCACHESIZE, size), Create(0, 1, 1, mode));
         svc = nullptr;
         ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text(name_), static_cast<ub4>(name_.size()),
                                    OCI_LOGON2_SPOOL)), 0);
@@ -292,8 +271,7 @@ TEST_F(Pools, WhatASessionLeaves) {
 
 // A newcomer stands behind who waits, though a session has just come back; a pool that grows has room for who waits.
 TEST_F(Pools, WhoWaitsComesFirst) {
-    ASSERT_EQ(Create(1, 1, 1), 0);
-    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT), 0);
+    MUST(Create(1, 1, 1), Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT));
     ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20000), 0);
     auto* err = New<OCIError>(OCI_HTYPE_ERROR);
     int overtaken = 0;
@@ -317,8 +295,7 @@ TEST_F(Pools, WhoWaitsComesFirst) {
             EXPECT_LT(std::chrono::steady_clock::now() - grown, 15s);
             again = held;
         } else {
-            EXPECT_EQ(Release(held), 0);
-            EXPECT_EQ(Get(&again, err_), 0);
+            SHOULD(Release(held), Get(&again, err_));
             overtaken += !came;
         }
         EXPECT_EQ(Release(again), 0);

@@ -73,9 +73,7 @@ protected:
 // What fails outside of a transaction leaves none behind: nobody has to wait for it.
 TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
     OCISvcCtx *first = nullptr, *second = nullptr;
-    ASSERT_EQ(LogOn(&first, "work"), 0);
-    ASSERT_EQ(Run(first, "create table t(a number unique)"), 0);
-    ASSERT_EQ(LogOn(&second, "work"), 0);
+    MUST(LogOn(&first, "work"), Run(first, "create table t(a number unique)"), LogOn(&second, "work"));
     const struct { const char* sql; sb4 answer; } cases[] = {
         {"rollback to nowhere", 1086}, {"release nowhere", 1086}, {"insert into t values('x')", 1722},
         {"begin insert into t values(1); insert into t values(1); end;", 1}, {"begin rollback to nowhere; end;", 1086}};
@@ -108,8 +106,7 @@ TEST_F(Sessions, AttributesFollowWhatHappens) {
         while (busy() == 0) std::this_thread::yield();
         EXPECT_EQ(Answer(OCIBreak(svc, err), err), 0);
     });
-    EXPECT_EQ(busy(), 0);
-    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    MUST(busy(), Answer(OCILogoff(svc, err_)));
     EXPECT_EQ(open(), 0u);
     EXPECT_EQ(Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION), nullptr);
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 0u) << "goes with the logon";
@@ -197,9 +194,7 @@ TEST_F(Sessions, UsedWhileAThreadLogsOnAndOff) {
             }
         }
     });
-    EXPECT_EQ(Answer(OCIReset(svc, err_)), 0);
-    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
-    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    SHOULD(Answer(OCIReset(svc, err_)), Answer(OCIPing(svc, err_, 0)), Answer(OCILogoff(svc, err_)));
 }
 
 TEST_F(Sessions, TwoThreadsLogOnAndOffOnOneContext) {
@@ -213,8 +208,7 @@ TEST_F(Sessions, TwoThreadsLogOnAndOffOnOneContext) {
             EXPECT_TRUE(answer == 0 || answer == 3114) << answer << ": the other has";
         }
     });
-    ASSERT_EQ(LogOn(&svc, "here"), 0);
-    EXPECT_EQ(Answer(OCIPing(svc, err_, 0)), 0);
+    MUST(LogOn(&svc, "here"), Answer(OCIPing(svc, err_, 0)));
 }
 
 TEST_F(Sessions, AttachedDetachedAndAskedByThreads) {

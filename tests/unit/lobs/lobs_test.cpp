@@ -251,8 +251,7 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
     Fetch(lob);
     Fetch(binary, "select b from l for update", SQLT_BLOB);
     Temporary(other);
-    ASSERT_EQ(Write(other, 1, "12\xC3\xB6" "4"), 0);
-    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 100, 3, 2)), 0);
+    MUST(Write(other, 1, "12\xC3\xB6" "4"), Answer(OCILobCopy(svc, err, lob, other, 100, 3, 2)));
     EXPECT_EQ(Read(lob), "11:h\xC3\xA4" "2\xC3\xB6" "4 world");
     EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, lob, 5, 2, 1)), 0);    // onto itself
     EXPECT_EQ(Read(lob), "11:hh\xC3\xA4" "2\xC3\xB6" "4world");
@@ -319,12 +318,10 @@ TEST_F(Lobs, EmptyOnesOfTheApplication) {
     EXPECT_EQ(Write(lob, 1, "x"), 22275);
     for (const ub2 type : {SQLT_CLOB, SQLT_BLOB}) {
         char seen[8] = "";
-        ASSERT_EQ(Ready("select quote(:1) from dual", {Locator(lob, type)}), 0);
-        ASSERT_EQ(Define(1, Text(seen)) + Execute(1), 0);
+        MUST(Ready("select quote(:1) from dual", {Locator(lob, type)}), Define(1, Text(seen)) + Execute(1));
         EXPECT_STREQ(seen, type == SQLT_CLOB ? "''" : "X''");
     }
-    ASSERT_EQ(Ready("insert into l values(9, :1, :2)", {Locator(lob), Locator(lob, SQLT_BLOB)}), 0);
-    EXPECT_EQ(Execute(), 0);
+    MUST(Ready("insert into l values(9, :1, :2)", {Locator(lob), Locator(lob, SQLT_BLOB)}), Execute());
     EXPECT_EQ(One("select length(c) + 10 * length(b) from l where k = 9"), "0");
     Fetch(lob, "select b from l where k = 9", SQLT_BLOB);
     EXPECT_EQ(LengthOf(lob), 0u);
@@ -332,11 +329,8 @@ TEST_F(Lobs, EmptyOnesOfTheApplication) {
 
 TEST_F(Lobs, BindsAndReturningTakeLocators) {
     Temporary(lob);
-    ASSERT_EQ(Write(lob, 1, "by bind"), 0);
-    ASSERT_EQ(Ready("insert into l(k, c) values(2, :1)", {Locator(lob)}), 0);
-    EXPECT_EQ(Execute(), 0);
-    ASSERT_EQ(Ready("insert into l(k, c) values(3, empty_clob()) returning c into :1", {Locator(other)}), 0);
-    EXPECT_EQ(Execute(), 0);
+    MUST(Write(lob, 1, "by bind"), Ready("insert into l(k, c) values(2, :1)", {Locator(lob)}), Execute());
+    MUST(Ready("insert into l(k, c) values(3, empty_clob()) returning c into :1", {Locator(other)}), Execute());
     EXPECT_EQ(Write(other, 1, "returned"), 0);
     EXPECT_EQ(One("select group_concat(c, '|') from l where k > 1"), "by bind|returned");
     boolean flag = TRUE;
@@ -351,8 +345,7 @@ TEST_F(Lobs, BindsAndReturningTakeLocators) {
     Fetch(lob, "values(cast('of no column' as clob))");
     EXPECT_EQ(Answer(OCILobIsTemporary(env, err, lob, &flag)), 0);
     EXPECT_EQ(flag, TRUE);
-    EXPECT_EQ(Answer(OCILobLocatorAssign(svc, err, lob, &other)), 0);
-    EXPECT_EQ(Write(other, 1, "x"), 0);
+    SHOULD(Answer(OCILobLocatorAssign(svc, err, lob, &other)), Write(other, 1, "x"));
     EXPECT_EQ(Read(lob, 2) + Read(other, 2), "2:of2:xf");      // a copy of its own
 }
 
@@ -365,8 +358,7 @@ TEST_F(Lobs, OpeningIsPerTransaction) {
     EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READONLY)), 0);
     EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 22293);
     EXPECT_EQ(Write(lob, 1, "x"), 22294);
-    EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 0);
-    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 0);
+    SHOULD(Answer(OCILobClose(svc, err, lob)), Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)));
     EXPECT_EQ(Write(lob, 1, "x"), 0);
     boolean open = FALSE;
     EXPECT_EQ(Answer(OCILobIsOpen(svc, err, lob, &open)), 0);
@@ -383,8 +375,7 @@ TEST_F(Lobs, BufferedWritesWait) {
     EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, lob)), 0);
     Fetch(other);
     EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, other)), 22277);
-    EXPECT_EQ(Write(lob, 1, "H"), 0);
-    EXPECT_EQ(Write(lob, 2, "A"), 0);
+    SHOULD(Write(lob, 1, "H"), Write(lob, 2, "A"));
     EXPECT_EQ(Read(other, 2), "2:h\xC3\xA4");
     EXPECT_EQ(Write(other, 1, "x"), 22277);                    // while what is written waits
     EXPECT_EQ(Answer(OCILobTrim(svc, err, other, 1)), 22277);
@@ -470,8 +461,7 @@ TEST_F(Lobs, SessionMayEndBeforeItsLocators) {
     Temporary(other);
     OCILogoff(svc, err);
     boolean flag = FALSE;
-    EXPECT_EQ(Answer(OCILobIsTemporary(env, err, other, &flag)), 0);
-    ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
+    MUST(Answer(OCILobIsTemporary(env, err, other, &flag)), Logon(&svc));
     EXPECT_EQ(Read(lob) + Read(other), "!22927!22927");
     EXPECT_EQ(OCIDescriptorFree(lob, OCI_DTYPE_LOB), OCI_SUCCESS);
 }

@@ -139,10 +139,8 @@ TEST_F(LongValues, ComeBackWholeFromEachKindOfTable) {
         EXPECT_EQ(TakePieces("select c from t", c.type), kLength);
         // From its locator into another row, which shows in the same table's other rows and nowhere else.
         ASSERT_EQ(Query("select c from t", {Locator(lob, c.locator)}), 0);
-        ASSERT_EQ(Ready("insert into t(k, c) values(2, :v)", {Locator(lob, c.locator)}), 0);
-        EXPECT_EQ(Execute(), 0);
-        ASSERT_EQ(Ready("update t set c = :v, k = k + 10 where k > 1", {Locator(lob, c.locator)}), 0);
-        EXPECT_EQ(Execute(), 0);
+        MUST(Ready("insert into t(k, c) values(2, :v)", {Locator(lob, c.locator)}), Execute());
+        MUST(Ready("update t set c = :v, k = k + 10 where k > 1", {Locator(lob, c.locator)}), Execute());
         EXPECT_EQ(TakePieces("select c from t where k > 1 order by k desc", c.type), kLength);
         MustRun("rollback");
         EXPECT_EQ(One("select count(*) from t"), "1");

@@ -133,13 +133,11 @@ TEST_F(FileCalls, ReadingAndWritingTakeTurns) {
     EXPECT_EQ(Write(file, "XY"), 0);
     EXPECT_EQ(Read(file, 10), "ef");
     EXPECT_EQ(Read(file, 10), "");
-    EXPECT_EQ(Write(file, "g"), 0);
-    EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 0);
+    SHOULD(Write(file, "g"), Answer(OCIFileFlush(env_, err_, file)));
     EXPECT_EQ(FileContents("both"), "abXYefg");
     OCIFileObject* reader = MustOpen("both", OCI_FILE_READ_ONLY, OCI_FILE_EXIST);
     EXPECT_EQ(Read(reader, 100), "abXYefg");
-    EXPECT_EQ(Write(file, "h"), 0);
-    EXPECT_EQ(Answer(OCIFileFlush(env_, err_, file)), 0);
+    SHOULD(Write(file, "h"), Answer(OCIFileFlush(env_, err_, file)));
     EXPECT_EQ(Read(reader, 100), "h") << "what is added behind the end can be read on";
     EXPECT_EQ(Write(reader, "x"), 30157);
     ub4 count = 0;
@@ -198,8 +196,7 @@ TEST_F(FileCalls, NamesInUtf16) {
     OCIFileObject* file = nullptr;
     ASSERT_EQ(Answer(OCIFileOpen(env_, err_, &file, Text(u"Größe"), Text(folder.u16string()), OCI_FILE_WRITE_ONLY,
                                  OCI_FILE_EXCL, OCI_FILE_BIN)), 0);
-    EXPECT_EQ(Write(file, "bytes"), 0);
-    EXPECT_EQ(Answer(OCIFileClose(env_, err_, file)), 0);
+    SHOULD(Write(file, "bytes"), Answer(OCIFileClose(env_, err_, file)));
     EXPECT_EQ(FileContents("Größe"), "bytes");
 }
 

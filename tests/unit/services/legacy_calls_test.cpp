@@ -17,6 +17,7 @@
 #include "oci.h"
 #include "oci_legacy.h"
 #include "support/at_once.h"
+#include "support/must.h"
 #include "support/postgres_database.h"
 
 namespace {
@@ -36,8 +37,7 @@ protected:
             database = server->Url();
             user = server->Owner() + "/secret";
         }
-        ASSERT_EQ(LogOn(lda), 0);
-        ASSERT_EQ(oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1), 0);
+        MUST(LogOn(lda), oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1));
         ASSERT_EQ(Parse("create table t (n integer, c varchar2(10))", 0), 0);
     }
     void TearDown() override {
@@ -56,8 +56,7 @@ protected:
     // The first value of a query.
     int One(const char* sql) {
         int value = -1;
-        EXPECT_EQ(Parse(sql), 0);
-        EXPECT_EQ(Define(1, &value, 4, SQLT_INT), 0);
+        SHOULD(Parse(sql), Define(1, &value, 4, SQLT_INT));
         EXPECT_EQ(oexfet(&cda, 1, 1, 0), 0) << sql;
         return value;
     }
@@ -77,8 +76,7 @@ protected:
         }
         ASSERT_EQ(Parse("insert into t values (:1, :text)"), 0);
         ASSERT_EQ(obndrn(&cda, 1, reinterpret_cast<ub1*>(numbers.data()), 4, SQLT_INT, -1, nullptr, nullptr, -1, -1), 0);
-        ASSERT_EQ(Bind("text", texts.data(), 4, SQLT_STR), 0);
-        ASSERT_EQ(oexn(&cda, rows, 0), 0);
+        MUST(Bind("text", texts.data(), 4, SQLT_STR), oexn(&cda, rows, 0));
         ASSERT_EQ(cda.rpc, static_cast<ub4>(rows));
     }
 
@@ -151,9 +149,7 @@ TEST_F(LegacyCalls, ColumnsAreDescribedUntilThereIsNone) {
     EXPECT_EQ(std::make_tuple(size, type, length, name[0], name[1], display, nulls),
               std::make_tuple(bytes, 1, 1, 'C', '#', bytes, 1));
     EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);    // at once, since it is compiled
-    EXPECT_EQ(Define(1, &number, 4, SQLT_INT), 0);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(ocan(&cda), 0);
+    SHOULD(Define(1, &number, 4, SQLT_INT), oexec(&cda), ocan(&cda));
     EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);
     EXPECT_EQ(odescr(&cda, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
     ASSERT_EQ(Parse("select n from t"), 0);
@@ -167,17 +163,14 @@ TEST_F(LegacyCalls, FetchesCountAndEnd) {
     EXPECT_EQ(ofetch(&cda), 1002);
     EXPECT_EQ(oexec(&cda), 0);
     std::array<int, 3> numbers{};
-    EXPECT_EQ(Define(1, numbers.data(), 4, SQLT_INT), 0);
-    EXPECT_EQ(ofetch(&cda), 0);
-    EXPECT_EQ(ofen(&cda, 3), 0);
+    SHOULD(Define(1, numbers.data(), 4, SQLT_INT), ofetch(&cda), ofen(&cda, 3));
     EXPECT_EQ(cda.rpc, 4u);
     EXPECT_EQ(numbers, (std::array{2, 3, 4}));
     EXPECT_EQ(ofen(&cda, 3), 1403);
     EXPECT_EQ(cda.v2_rc, 4);
     EXPECT_EQ(cda.rpc, 5u);
     EXPECT_EQ(ofetch(&cda), 1002);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(ocan(&cda), 0);
+    SHOULD(oexec(&cda), ocan(&cda));
     EXPECT_EQ(ofetch(&cda), 1002);
     struct { ub4 rows; sword cancel, exact, result; ub4 processed; sword next; } const kCases[] = {
         {0, 0, 0, 24333, 0, 1002}, {3, 0, 0, 0, 3, 0},    {3, 1, 0, 0, 3, 1002},
@@ -199,13 +192,10 @@ TEST_F(LegacyCalls, RowsThatCannotBeStoredArePassedOver) {
     ASSERT_EQ(Parse("select 'abcdef', 1 from dual union all select null, 2 from dual union all select 'x', 3 from dual"), 0);
     sb2 indicator = 0;
     ub2 code = 0;
-    EXPECT_EQ(Define(1, characters.data(), 3, SQLT_STR), 0);
-    EXPECT_EQ(oexec(&cda), 0);
+    SHOULD(Define(1, characters.data(), 3, SQLT_STR), oexec(&cda));
     for (const sword result : {1406, 1405, 0, 1403}) EXPECT_EQ(ofetch(&cda), result);
     EXPECT_EQ(cda.rpc, 1u);
-    EXPECT_EQ(Define(1, characters.data(), 3, SQLT_STR, &indicator, &code), 0);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(ofetch(&cda), 0);
+    SHOULD(Define(1, characters.data(), 3, SQLT_STR, &indicator, &code), oexec(&cda), ofetch(&cda));
     EXPECT_EQ(std::make_tuple(cda.wrn, code, indicator), std::make_tuple(3, 1406, 6));
     EXPECT_EQ(ofetch(&cda), 0);
     EXPECT_EQ(std::make_tuple(cda.wrn, code, indicator), std::make_tuple(0, 1405, -1));
@@ -255,8 +245,7 @@ TEST_F(LegacyCalls, ValuesGoInPieces) {
     EXPECT_EQ(std::make_tuple(told, iteration, index), std::make_tuple(static_cast<dvoid*>(&context), 0u, 0u));
     EXPECT_EQ(osetpi(&cda, OCI_FIRST_PIECE, T("abc"), &length), 0);
     EXPECT_EQ(oexec(&cda), 3129);
-    EXPECT_EQ(osetpi(&cda, OCI_LAST_PIECE, T("def"), &length), 0);
-    EXPECT_EQ(oexec(&cda), 0);
+    SHOULD(osetpi(&cda, OCI_LAST_PIECE, T("def"), &length), oexec(&cda));
     EXPECT_EQ(cda.rpc, 1u);
 
     ASSERT_EQ(Parse("select c from t"), 0);
@@ -267,8 +256,7 @@ TEST_F(LegacyCalls, ValuesGoInPieces) {
     sword result = ofetch(&cda);
     for (int pieces = 0; result == 3130 && pieces < 3; ++pieces) {
         length = 4;
-        EXPECT_EQ(ogetpi(&cda, &piece, &told, &iteration, &index), 0);
-        EXPECT_EQ(osetpi(&cda, piece, characters.data(), &length), 0);
+        SHOULD(ogetpi(&cda, &piece, &told, &iteration, &index), osetpi(&cda, piece, characters.data(), &length));
         result = ofetch(&cda);
         whole.append(characters.data(), length);
     }
@@ -295,8 +283,7 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
 TEST_F(LegacyCalls, PartsOfLongValues) {
     ASSERT_EQ(Run("create table l (n integer, c long, r raw(10))"), 0);
     ASSERT_EQ(Run("insert into l values (1, 'abcdefghij', hextoraw('00FF41'))"), 0);
-    ASSERT_EQ(Run("insert into l values (2, null, null)"), 0);
-    ASSERT_EQ(Parse("select n, c, r from l order by n"), 0);
+    MUST(Run("insert into l values (2, null, null)"), Parse("select n, c, r from l order by n"));
     ub4 length = 9;
     std::string part(4, '#');
     const auto read = [&](sword position, sb4 offset, sb4 room = 4, sword type = 8) {
@@ -305,8 +292,7 @@ TEST_F(LegacyCalls, PartsOfLongValues) {
     };
     EXPECT_EQ(read(2, 0), 1002);
     std::array<int, 2> numbers{};
-    ASSERT_EQ(Define(1, numbers.data(), 4, SQLT_INT), 0);
-    ASSERT_EQ(oexec(&cda), 0);
+    MUST(Define(1, numbers.data(), 4, SQLT_INT), oexec(&cda));
     EXPECT_EQ(read(2, 0), 1002);
     ASSERT_EQ(ofetch(&cda), 0);
     const struct { sword position; sb4 offset; std::string_view expected; } kParts[] = {
@@ -333,12 +319,10 @@ TEST_F(LegacyCalls, PartsOfLongValues) {
 }
 
 TEST_F(LegacyCalls, ExecutesThatFailUndoARowOrAll) {
-    ASSERT_EQ(Run("create unique index u on t (n)"), 0);
-    ASSERT_EQ(Run("insert into t values (9, null)"), 0);
+    MUST(Run("create unique index u on t (n)"), Run("insert into t values (9, null)"));
     std::array<int, 5> numbers{7, 1, 2, 1, 3};    // of which the first is passed over
     const auto insert = [&](sword rollback) {
-        EXPECT_EQ(Parse("insert into t values (:n, null)"), 0);
-        EXPECT_EQ(oopt(&cda, rollback, 0), 0);
+        SHOULD(Parse("insert into t values (:n, null)"), oopt(&cda, rollback, 0));
         EXPECT_EQ(Bind("n", numbers.data(), 4, SQLT_INT), 0);
         return oexn(&cda, 5, 1);
     };
@@ -352,11 +336,9 @@ TEST_F(LegacyCalls, ExecutesThatFailUndoARowOrAll) {
     EXPECT_EQ(insert(0), 1);    // the first of its transaction
     EXPECT_EQ(orol(&lda), 0);
     numbers[3] = 4;
-    EXPECT_EQ(ocon(&lda), 0);
-    EXPECT_EQ(insert(0), 0);
+    SHOULD(ocon(&lda), insert(0));
     EXPECT_EQ(cda.rpc, 4u);
-    EXPECT_EQ(ocof(&lda), 0);
-    EXPECT_EQ(orol(&lda), 0);
+    SHOULD(ocof(&lda), orol(&lda));
     EXPECT_EQ(One("select count(*) from t"), 4);
 
     // Values in pieces: the first row is done when the last one fails; nothing else runs in between.
@@ -387,26 +369,20 @@ TEST_F(LegacyCalls, LocksAreWaitedForOrNot) {
     if (!server) {
         EXPECT_EQ(ologof(&lda), 0);
         database = file;
-        ASSERT_EQ(LogOn(lda), 0);
-        ASSERT_EQ(oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1), 0);
+        MUST(LogOn(lda), oopen(&cda, &lda, nullptr, -1, -1, nullptr, -1));
         ASSERT_EQ(Run("create table t (n integer, c varchar2(10))"), 0);
     }
-    ASSERT_EQ(Run("insert into t values (1, 'a')"), 0);
-    ASSERT_EQ(ocom(&lda), 0);
-    ASSERT_EQ(LogOn(second), 0);
+    MUST(Run("insert into t values (1, 'a')"), ocom(&lda), LogOn(second));
     ASSERT_EQ(oopen(&holder, &second, nullptr, -1, -1, nullptr, -1), 0);
     const auto hold = [&] {
-        EXPECT_EQ(oparse(&holder, T("update t set c = 'b'"), -1, 1, 2), 0);
-        EXPECT_EQ(oexec(&holder), 0);
+        SHOULD(oparse(&holder, T("update t set c = 'b'"), -1, 1, 2), oexec(&holder));
     };
     hold();
-    ASSERT_EQ(Parse("update t set c = 'c' where n = 1"), 0);
-    ASSERT_EQ(oopt(&cda, 2, 4), 0);
+    MUST(Parse("update t set c = 'c' where n = 1"), oopt(&cda, 2, 4));
     const auto start = Clock::now();
     EXPECT_EQ(oexec(&cda), 54);
     EXPECT_LT(Clock::now() - start, 1s);
-    EXPECT_EQ(orol(&second), 0);
-    EXPECT_EQ(oexec(&cda), 0);
+    SHOULD(orol(&second), oexec(&cda));
     EXPECT_EQ(orol(&lda), 0);    // the wish is not taken back with it
     hold();
     EXPECT_EQ(oexec(&cda), 54);
@@ -417,8 +393,7 @@ TEST_F(LegacyCalls, LocksAreWaitedForOrNot) {
     });
     EXPECT_EQ(oexec(&cda), 0);
     releasing.join();
-    EXPECT_EQ(ocom(&lda), 0);
-    EXPECT_EQ(ologof(&second), 0);
+    SHOULD(ocom(&lda), ologof(&second));
     if (server) return;
     for (const char* ending : {"", "-wal", "-shm", "-journal"}) std::filesystem::remove(file.string() + ending);
 }
@@ -489,9 +464,7 @@ TEST_F(LegacyBridges, ALoginBecomesAContext) {
     OCISvcCtx* const same = taken;
     EXPECT_EQ(OCILdaToSvcCtx(&taken, err, &lda), OCI_SUCCESS);
     EXPECT_EQ(taken, same);
-    EXPECT_EQ(ExecuteOn(taken, "create table made (n integer)"), 0);
-    EXPECT_EQ(OCILogoff(taken, err), 0);
-    ASSERT_EQ(LogOn(lda), 0);
+    MUST(ExecuteOn(taken, "create table made (n integer)"), OCILogoff(taken, err), LogOn(lda));
 }
 
 TEST_F(LegacyBridges, AContextLendsItsSession) {
@@ -510,8 +483,7 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
         ASSERT_EQ(ExecuteOn(service, "create table t (n integer, c varchar2(10))"), 0);
     }
     EXPECT_EQ(Number(OCISvcCtxToLda(service, err, &lda)), 1015);
-    ASSERT_EQ(ExecuteOn(service, "insert into t values (1, null)"), 0);
-    ASSERT_EQ(OCISvcCtxToLda(service, err, &lent), 0);
+    MUST(ExecuteOn(service, "insert into t values (1, null)"), OCISvcCtxToLda(service, err, &lent));
     OCISession* session = nullptr;
     EXPECT_EQ(OCIAttrGet(service, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err), 0);
     EXPECT_EQ(Number(OCISessionEnd(service, err, static_cast<OCISession*>(New(OCI_HTYPE_SESSION)), 0)), 1012);
@@ -528,8 +500,7 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
     EXPECT_EQ(current, 0);
     Cda_Def cursor{};
     ASSERT_EQ(oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1), 0);
-    ASSERT_EQ(oparse(&cursor, T("insert into t values (2, null)"), -1, 1, 2), 0);
-    EXPECT_EQ(oexec(&cursor), 0);
+    MUST(oparse(&cursor, T("insert into t values (2, null)"), -1, 1, 2), oexec(&cursor));
     OCISvcCtx* back = nullptr;
     EXPECT_EQ(OCILdaToSvcCtx(&back, err, &lent), 0);
     EXPECT_EQ(back, service);
@@ -538,11 +509,9 @@ TEST_F(LegacyBridges, AContextLendsItsSession) {
     EXPECT_EQ(OCITransRollback(service, err, 0), 0);
     EXPECT_EQ(CountOn(service), 0);
     // The end of the context is the end of the login.
-    ASSERT_EQ(OCISvcCtxToLda(service, err, &lent), 0);
-    ASSERT_EQ(oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1), 0);
+    MUST(OCISvcCtxToLda(service, err, &lent), oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1));
     if (server) {    // which waits for what is left unfinished
-        ASSERT_EQ(oparse(&cursor, T("select pg_sleep(0.5)"), -1, 1, 2), 0);
-        ASSERT_EQ(onbset(&lent), 0);
+        MUST(oparse(&cursor, T("select pg_sleep(0.5)"), -1, 1, 2), onbset(&lent));
         EXPECT_EQ(oexec(&cursor), 3123);
         EXPECT_EQ(Number(OCILdaToSvcCtx(&back, err, &lent)), 3127);
     }
@@ -582,14 +551,12 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
     EXPECT_EQ(cda.rpc, 1u);
 
     std::array<int, 5> numbers{};
-    ASSERT_EQ(Parse("select n from t order by n"), 0);
-    ASSERT_EQ(Define(1, numbers.data(), 4, SQLT_INT), 0);
+    MUST(Parse("select n from t order by n"), Define(1, numbers.data(), 4, SQLT_INT));
     EXPECT_EQ(finish([&] { return oexfet(&cda, 5, 0, 1); }), 0);
     EXPECT_EQ(numbers, (std::array{1, 2, 3, 4, 5}));
     ASSERT_EQ(Parse("delete from t where n > :n"), 0);
     number = 3;
-    ASSERT_EQ(Bind("n", &number, 4, SQLT_INT), 0);
-    EXPECT_EQ(finish([&] { return oexn(&cda, 1, 0); }), 0);
+    MUST(Bind("n", &number, 4, SQLT_INT), finish([&] { return oexn(&cda, 1, 0); }));
     EXPECT_EQ(cda.rpc, 2u);
     if (!server) return;
     ASSERT_EQ(Parse("select 1 / 0 from t"), 0);
@@ -608,9 +575,7 @@ TEST_F(LegacyCalls, ABreakEndsTheCallOnce) {
                                      : "with recursive r(n) as (select 1 union all select n + 1 from r) select count(*) from r";
     Fill(1);
     for (const bool blocks : {true, false}) {
-        ASSERT_EQ((blocks ? onbclr : onbset)(&lda), 0);
-        ASSERT_EQ(Parse(kLong), 0);
-        ASSERT_EQ(Define(1, &number, 4, SQLT_INT), 0);
+        MUST((blocks ? onbclr : onbset)(&lda), Parse(kLong), Define(1, &number, 4, SQLT_INT));
         std::thread stopping([&] {
             std::this_thread::sleep_for(100ms);
             EXPECT_EQ(obreak(&lda), 0);
@@ -647,8 +612,7 @@ TEST_F(LegacyCalls, AreasInTwoThreads) {
             sum += value;
         }
         EXPECT_EQ(sum, 210);
-        EXPECT_EQ(oclose(&cursor), 0);
-        EXPECT_EQ(ologof(&login), 0);
+        SHOULD(oclose(&cursor), ologof(&login));
     });
 }
 

@@ -79,8 +79,7 @@ TEST_F(ThreadCalls, HandlesAreJoinedOnceAndClosedOnce) {
 TEST_F(ThreadCalls, AThreadThatCannotStart) {
     OCIThreadHandle* handle = NewHandle();
     OCIThreadId *id = NewId(), *own = NewId();
-    ASSERT_EQ(Answer(OCIThreadIdGet(env_, err_, id)), 0);
-    ASSERT_EQ(Answer(OCIThreadIdGet(env_, err_, own)), 0);
+    MUST(Answer(OCIThreadIdGet(env_, err_, id)), Answer(OCIThreadIdGet(env_, err_, own)));
     pthread_attr_t usual, huge;
     pthread_getattr_default_np(&usual);
     pthread_attr_init(&huge);
@@ -185,9 +184,8 @@ TEST_F(ThreadCalls, ManyThreadsAtOnce) {
         ASSERT_EQ(OCIThreadCreate(env_, err_, routine, &work, NewId(), handles.back()), OCI_SUCCESS);
     }
     for (OCIThreadHandle* handle : handles) {
-        EXPECT_EQ(OCIThreadJoin(env_, err_, handle), OCI_SUCCESS);
-        EXPECT_EQ(OCIThreadClose(env_, err_, handle), OCI_SUCCESS);
-        EXPECT_EQ(OCIThreadHndDestroy(env_, err_, &handle), OCI_SUCCESS);
+        SHOULD(OCIThreadJoin(env_, err_, handle), OCIThreadClose(env_, err_, handle));
+        EXPECT_EQ(OCIThreadHndDestroy(env_, err_, &handle), 0);
     }
     EXPECT_EQ(work.failures, 0);
     EXPECT_EQ(work.counter, kThreads * kRounds);

@@ -76,16 +76,14 @@ TEST_F(Blocks, RunOnceForEachRow) {
     EXPECT_EQ(Rows(), "") << "all iterations are one block";
     for (const ub4 rows : {3u, 2u}) {
         MustRun("delete from t");
-        ASSERT_EQ(Ready(block, {Int(numbers)}), 0);
-        ASSERT_EQ(Execute(rows), 0);
+        MUST(Ready(block, {Int(numbers)}), Execute(rows));
         EXPECT_EQ(RowCount(), rows);
     }
     numbers[0] = 5;
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(RowCount(), 1u) << "the former execute's rows are not counted again";
     MustRun("delete from t");
-    ASSERT_EQ(Ready(block, {Int(numbers)}), 0);
-    ASSERT_EQ(Execute(3, OCI_DEFAULT, 1), 0);
+    MUST(Ready(block, {Int(numbers)}), Execute(3, OCI_DEFAULT, 1));
     EXPECT_EQ(Rows(), "2,3") << "from the row offset on";
 }
 
@@ -93,8 +91,7 @@ TEST_F(Blocks, RunOnceForEachRow) {
 TEST_F(Blocks, TablesAtTheirLimits) {
     sb4 in[8] = {1, 2, 3, 4, 5, 6, 7, 8};
     ub4 current = 3;
-    ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
-    ASSERT_EQ(Bind(1, Int(in), OCI_DEFAULT, 5, &current), 0);
+    MUST(Prepare("insert into t values(:1)"), Bind(1, Int(in), OCI_DEFAULT, 5, &current));
     EXPECT_EQ(Execute(), 1484) << "in blocks only";
     current = 6;
     EXPECT_EQ(Bind(1, Int(in), OCI_DEFAULT, 5, &current), 1414);
@@ -103,8 +100,7 @@ TEST_F(Blocks, TablesAtTheirLimits) {
     for (const auto& c : into) {
         MustRun("delete from t");
         current = 0;
-        ASSERT_EQ(Prepare("begin insert into t values(:1); end;"), 0);
-        ASSERT_EQ(Bind(1, Int(in), OCI_DEFAULT, 3, &current), 0);
+        MUST(Prepare("begin insert into t values(:1); end;"), Bind(1, Int(in), OCI_DEFAULT, 3, &current));
         current = c.current;    // as applications set it: before each execute
         EXPECT_EQ(Execute(), c.answer) << c.current;
         EXPECT_EQ(Rows(), c.rows) << c.current;
@@ -131,8 +127,7 @@ TEST_F(Blocks, TablesAtTheirLimits) {
     ASSERT_EQ(Bind(1, Int(in), OCI_DEFAULT, 8, &current) + Bind(2, Int(in), OCI_DEFAULT, 8, &shorter), 0);
     EXPECT_EQ(Execute(), 6502) << "tables of two lengths";
     ASSERT_EQ(Prepare("begin update t set a = a + 10 where a = :1 returning a into :2; end;"), 0);
-    ASSERT_EQ(Bind(1, Int(in), OCI_DEFAULT, 8, &current) + Bind(2, Int(plain)), 0);
-    EXPECT_EQ(Execute(), 0);
+    MUST(Bind(1, Int(in), OCI_DEFAULT, 8, &current) + Bind(2, Int(plain)), Execute());
     EXPECT_EQ(plain, 13) << "of the last element";
     // From one table into another that is just full, and one element short.
     for (const ub4 most : {3u, 2u}) {

@@ -132,8 +132,7 @@ TEST_F(Dynamic, ValuesGoInByIteration) {
         MustRun("create table t(id number, a varchar2(40))");
         std::vector<sb4> ids(c.rows, 1);
         Giver giver(c.given);
-        ASSERT_EQ(Prepare("insert into t values(:1, :2)"), 0);
-        ASSERT_EQ(Bind(1, {ids.data(), 4, SQLT_INT}), 0);
+        MUST(Prepare("insert into t values(:1, :2)"), Bind(1, {ids.data(), 4, SQLT_INT}));
         ASSERT_EQ(BindTo(2, &giver, nullptr), 0);
         EXPECT_EQ(Execute(c.rows), c.answer) << c.asked;
         EXPECT_EQ(giver.asked, c.asked);
@@ -148,12 +147,8 @@ TEST_F(Dynamic, RowsComeOutByCallbacks) {
     for (const ub4 rows : {1, 2, 3}) {
         Taker a(3), b(20), c(4);
         sb4 ids[3] = {};
-        ASSERT_EQ(Prepare("select a, b, c, id from t order by id"), 0);
-        ASSERT_EQ(DefineTo(1, a), 0);
-        ASSERT_EQ(DefineTo(2, b, SQLT_LBI), 0);
-        ASSERT_EQ(DefineTo(3, c, SQLT_LNG), 0);
-        ASSERT_EQ(Define(4, Int(ids)), 0);
-        ASSERT_EQ(Execute(0), 0);
+        MUST(Prepare("select a, b, c, id from t order by id"), DefineTo(1, a), DefineTo(2, b, SQLT_LBI));
+        MUST(DefineTo(3, c, SQLT_LNG), Define(4, Int(ids)), Execute(0));
         sword rc = OCI_SUCCESS;
         for (ub4 done = 0; rc == OCI_SUCCESS && done < 3; done += RowsFetched()) rc = FetchCode(rows);
         EXPECT_EQ(a.Flush(), "abcdefg|-|x|");
@@ -180,11 +175,8 @@ TEST_F(Dynamic, ReturningFeedsRowsByIteration) {
             return take(out);
         };
         Giver nulls({"0", "0", "0"});
-        ASSERT_EQ(Prepare("update t set a = a where id = :1 returning a, id into :2, :3"), 0);
-        ASSERT_EQ(Bind(1, Int(ids)), 0);
-        ASSERT_EQ(BindTo(2, asks_in ? &nulls : nullptr, &taker), 0);
-        ASSERT_EQ(Bind(3, Int(last)), 0);
-        EXPECT_EQ(Execute(3), 0);
+        MUST(Prepare("update t set a = a where id = :1 returning a, id into :2, :3"), Bind(1, Int(ids)));
+        MUST(BindTo(2, asks_in ? &nulls : nullptr, &taker), Bind(3, Int(last)), Execute(3));
         EXPECT_EQ(taker.asked, "0.0.0 0.0.2 0.1.0 0.1.2 2.0.0 ");
         EXPECT_EQ(counts, "22221");
         EXPECT_EQ(taker.Flush(), "one|uno|-|");
@@ -201,10 +193,8 @@ TEST_F(Dynamic, BlocksAndTables) {
     Taker taker(10), rows(10);
     ub4 count = 2;
     ASSERT_EQ(Prepare("begin :v := :v || :v; insert into t values(:v); insert into t values(:e) returning a || '!' into :e; end;"), 0);
-    ASSERT_EQ(BindTo(1, &giver, &taker), 0);
-    ASSERT_EQ(Bind(&binds_[2], 2, InPieces(SQLT_CHR), OCI_DEFAULT, 2, &count), 0);
-    ASSERT_EQ(Answer(OCIBindDynamic(binds_[2], err, &elements, Callback::In, &rows, Callback::Out)), 0);
-    ASSERT_EQ(Execute(2), 0);
+    MUST(BindTo(1, &giver, &taker), Bind(&binds_[2], 2, InPieces(SQLT_CHR), OCI_DEFAULT, 2, &count));
+    MUST(Answer(OCIBindDynamic(binds_[2], err, &elements, Callback::In, &rows, Callback::Out)), Execute(2));
     EXPECT_EQ(elements.asked, "0.0.0 0.1.0 1.0.0 1.1.0 ");
     EXPECT_EQ(rows.asked, elements.asked);
     EXPECT_EQ(rows.Flush(), "p!|q!|r!|s!|");
@@ -215,8 +205,7 @@ TEST_F(Dynamic, BlocksAndTables) {
     Taker selected(9);
     ASSERT_EQ(Prepare("begin select a into :e from t where length(a) = 1 order by a; end;"), 0);
     ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR), OCI_DEFAULT, 4, &(count = 0)), 0);
-    ASSERT_EQ(Answer(OCIBindDynamic(binds_[1], err, &elements, Callback::In, &selected, Callback::Out)), 0);
-    EXPECT_EQ(Execute(), 0);
+    MUST(Answer(OCIBindDynamic(binds_[1], err, &elements, Callback::In, &selected, Callback::Out)), Execute());
     EXPECT_EQ(selected.Flush(), "p|q|r|s|");
 }
 
@@ -260,19 +249,16 @@ TEST_F(Dynamic, AnswersThatAreRefused) {
             out = {c.buffer, c.length, c.piece, c.indicator};
             return c.code;
         };
-        ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
-        ASSERT_EQ(BindTo(1, &callback, nullptr), 0);
+        MUST(Prepare("insert into t values(:1)"), BindTo(1, &callback, nullptr));
         EXPECT_EQ(Execute(2), c.in);
         EXPECT_EQ(RowCount(), c.in == 0 ? 2u : 0u);
-        ASSERT_EQ(Prepare("select 'abc' from dual union all select 'def' from dual"), 0);
-        ASSERT_EQ(DefineTo(1, callback), 0);
+        MUST(Prepare("select 'abc' from dual union all select 'def' from dual"), DefineTo(1, callback));
         ASSERT_EQ(Execute(0), 0);
         EXPECT_EQ(Fetch(), c.out);
         EXPECT_EQ(RowsFetched(), c.out == 0 ? 1u : 0u);
         EXPECT_EQ(Fetch(), c.out) << "the next row";
         EXPECT_EQ(Fetch(), 1403);
-        ASSERT_EQ(Prepare("insert into t values('abc') returning a into :1"), 0);
-        ASSERT_EQ(BindTo(1, nullptr, &callback), 0);
+        MUST(Prepare("insert into t values('abc') returning a into :1"), BindTo(1, nullptr, &callback));
         EXPECT_EQ(Execute(), c.out);
     }
     const auto no_length = [](dvoid* context, OCIDefine*, ub4, dvoid** buffer, ub4** length, ub1*, dvoid**, ub2**) -> sb4 {
@@ -316,8 +302,7 @@ TEST_F(Dynamic, CallbacksThatCallTheLibrary) {
         if (c.in != kNotAsked) {
             stmt = New<OCIStmt>(OCI_HTYPE_STMT);
             plain_bind = nullptr;
-            ASSERT_EQ(Prepare("insert into t values(:1 || :2)"), 0);
-            ASSERT_EQ(BindTo(1, &callback, nullptr), 0);
+            MUST(Prepare("insert into t values(:1 || :2)"), BindTo(1, &callback, nullptr));
             ASSERT_EQ(Bind(&plain_bind, 2, Int(numbers)), 0);
             EXPECT_EQ(Execute(2), c.in) << &c - cases;
             EXPECT_EQ(answered, c.answer) << &c - cases;
@@ -326,8 +311,7 @@ TEST_F(Dynamic, CallbacksThatCallTheLibrary) {
         if (c.out == kNotAsked) continue;
         stmt = New<OCIStmt>(OCI_HTYPE_STMT);
         plain_define = nullptr, numbers[0] = numbers[1] = 0, answered = -1;
-        ASSERT_EQ(Prepare("select 'abc', 7 from dual union all select 'def', 8 from dual"), 0);
-        ASSERT_EQ(DefineTo(1, callback), 0);
+        MUST(Prepare("select 'abc', 7 from dual union all select 'def', 8 from dual"), DefineTo(1, callback));
         ASSERT_EQ(Define(&plain_define, 2, Int(numbers)), 0);
         ASSERT_EQ(Execute(0), 0) << &c - cases;
         EXPECT_EQ(Fetch(2), c.out) << &c - cases;
@@ -356,8 +340,7 @@ TEST_F(Dynamic, IterationsThatAreUndone) {
             stmt = inner;
             return OCI_ERROR;
         };
-        ASSERT_EQ(Prepare("insert into t values('v') returning a into :1"), 0);
-        ASSERT_EQ(BindTo(1, nullptr, &taker), 0);
+        MUST(Prepare("insert into t values('v') returning a into :1"), BindTo(1, nullptr, &taker));
         EXPECT_EQ(Execute(3), 24343);
         EXPECT_EQ(RowCount(), c.count);
         EXPECT_EQ(One("select nvl(group_concat(a, ','), '-') from t"), c.stored);
@@ -374,23 +357,19 @@ TEST_F(Dynamic, CutValuesAndFailedRows) {
         taker.room = out.piece == OCI_ONE_PIECE ? 3 : 0;
         return take(out);
     };
-    ASSERT_EQ(Prepare("select 'abcdef' from dual"), 0);
-    ASSERT_EQ(DefineTo(1, taker), 0);
+    MUST(Prepare("select 'abcdef' from dual"), DefineTo(1, taker));
     EXPECT_EQ(Execute(1), 24345);
     EXPECT_EQ(taker.Flush(), "abc|");
     EXPECT_EQ(taker.indicator, 6);
     EXPECT_EQ(taker.code, 1406);
-    ASSERT_EQ(Prepare("insert into t values('abcdef', null) returning a into :1"), 0);
-    ASSERT_EQ(BindTo(1, nullptr, &taker), 0);
+    MUST(Prepare("insert into t values('abcdef', null) returning a into :1"), BindTo(1, nullptr, &taker));
     EXPECT_EQ(Execute(), 24345);
     taker.tells_code = false;
     EXPECT_EQ(Execute(), 1406);
     Taker returned(9);
     char in[2][5] = {"long", "s"}, narrow[2][2] = {};
-    ASSERT_EQ(Prepare("insert into t values('a', :1) returning a, b into :2, :3"), 0);
-    ASSERT_EQ(Bind(1, Text(in)), 0);
-    ASSERT_EQ(BindTo(2, nullptr, &returned), 0);
-    ASSERT_EQ(Bind(3, Text(narrow)), 0);
+    MUST(Prepare("insert into t values('a', :1) returning a, b into :2, :3"), Bind(1, Text(in)));
+    MUST(BindTo(2, nullptr, &returned), Bind(3, Text(narrow)));
     EXPECT_EQ(Execute(2, OCI_BATCH_ERRORS), 24381);
     EXPECT_EQ(returned.asked, "1.0.0 ");
 }
@@ -406,15 +385,11 @@ TEST_F(Utf16Dynamic, PiecesOfUnits) {
     const string text(reinterpret_cast<const char*>(u"a\U0001F600z"), 8);
     Giver giver({"<" + text.substr(0, 3), "+" + text.substr(3, 2), ">" + text.substr(5)});
     Taker returned(5), fetched(20);
-    ASSERT_EQ(Prepare("insert into t values(:1) returning a into :2"), 0);
-    ASSERT_EQ(BindTo(1, &giver, nullptr), 0);
-    ASSERT_EQ(BindTo(2, nullptr, &returned), 0);
-    ASSERT_EQ(Execute(), 0);
+    MUST(Prepare("insert into t values(:1) returning a into :2"), BindTo(1, &giver, nullptr));
+    MUST(BindTo(2, nullptr, &returned), Execute());
     EXPECT_EQ(returned.Flush(), text + "|");
     EXPECT_EQ(returned.asked, "0.0.0 0.0.2 0.0.2 ");
-    ASSERT_EQ(Prepare("select a || a from t"), 0);
-    ASSERT_EQ(DefineTo(1, fetched, SQLT_STR), 0);
-    ASSERT_EQ(Execute(1), 0);
+    MUST(Prepare("select a || a from t"), DefineTo(1, fetched, SQLT_STR), Execute(1));
     EXPECT_EQ(fetched.Flush(), text + text + "|");
 }
 

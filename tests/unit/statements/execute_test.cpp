@@ -69,9 +69,7 @@ TEST_F(Executing, TruncateEmptiesTheTableForGood) {
 
 TEST_F(Executing, ParseOnlyRunsNothingAndComesFirst) {
     MustRun("create table t(a number)");
-    ASSERT_EQ(Prepare("insert into t values(1)"), 0);
-    EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 0);
-    EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 0);
+    MUST(Prepare("insert into t values(1)"), Execute(1, OCI_PARSE_ONLY), Execute(1, OCI_PARSE_ONLY));
     EXPECT_EQ(Rows(), "0");
     EXPECT_EQ(Execute(), 0);
     EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 24382);
@@ -144,8 +142,7 @@ TEST_F(Executing, ThroughAnotherSession) {
     ASSERT_EQ(Query("select a from t", {Int(value)}, 0), 0);
     for (const sb4 number : {2, 1, 2}) {
         svc = services[number - 1];
-        ASSERT_EQ(Execute(0), 0);
-        ASSERT_EQ(Fetch(), 0);
+        MUST(Execute(0), Fetch());
         EXPECT_EQ(value, number);
         for (OCISvcCtx* service : services) {
             const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, service, OCI_HTYPE_SVCCTX);
@@ -157,8 +154,7 @@ TEST_F(Executing, ThroughAnotherSession) {
 
 TEST_F(Executing, LogoffEndsWhatIsOpen) {
     sb4 value = 0;
-    ASSERT_EQ(Query("select 1 from dual", {Int(value)}, 0), 0);
-    ASSERT_EQ(OCILogoff(svc, err), OCI_SUCCESS);
+    MUST(Query("select 1 from dual", {Int(value)}, 0), OCILogoff(svc, err));
     EXPECT_EQ(Fetch(), 3114);
     EXPECT_EQ(Execute(0), 3114);
     ASSERT_EQ(Prepare("select 2 from dual"), 0);
@@ -169,8 +165,7 @@ TEST_F(Executing, RowIdOfTheLastChange) {
     MustRun("create table t(a number)", "insert into t values(7)", "insert into t values(8)");
     auto* rowid = NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
     ASSERT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, rowid, nullptr, OCI_ATTR_ROWID, err)), 0);
-    ASSERT_EQ(Ready("update t set a = 9 where rowid = :r", {{&rowid, 8, SQLT_RDD}}), 0);
-    ASSERT_EQ(Execute(), 0);
+    MUST(Ready("update t set a = 9 where rowid = :r", {{&rowid, 8, SQLT_RDD}}), Execute());
     EXPECT_EQ(One("select group_concat(a) from t"), "7,9");
     EXPECT_EQ(One("select a from t where rowid = '" + One("select rowid from t where a = 9") + "'"), "9");
     char text[19] = "";
@@ -179,8 +174,7 @@ TEST_F(Executing, RowIdOfTheLastChange) {
     ASSERT_EQ(Prepare("select length(:r) from t where rowid = :r and a = 7"), 0);
     ASSERT_EQ(BindName("r", Text(text)) + Define(1, Int(length)) + Execute(1), 0);
     EXPECT_EQ(length, 18);
-    ASSERT_EQ(Ready("delete from t where rowid = :r", {Text(text)}), 0);
-    ASSERT_EQ(Execute(), 0);
+    MUST(Ready("delete from t where rowid = :r", {Text(text)}), Execute());
     EXPECT_EQ(RowCount(), 1u);
     EXPECT_EQ(Execute(), 0);
     EXPECT_EQ(RowCount(), 0u);
@@ -196,8 +190,7 @@ TEST_F(Executing, ReturningGivesValuesBack) {
     sb2 indicators[2] = {};
     ASSERT_EQ(Prepare("insert into t values(:a, 'n' || :a) returning b into :b"), 0);
     EXPECT_EQ(Attribute<ub1>(OCI_ATTR_STMT_IS_RETURNING), 1);
-    ASSERT_EQ(BindName(":a", Int(numbers)) + BindName(":b", Text(texts, indicators)), 0);
-    ASSERT_EQ(Execute(2), 0);
+    MUST(BindName(":a", Int(numbers)) + BindName(":b", Text(texts, indicators)), Execute(2));
     EXPECT_STREQ(texts[0], "n1");
     EXPECT_STREQ(texts[1], "n2");
     EXPECT_EQ(RowCount(), 2u);
@@ -214,8 +207,7 @@ TEST_F(Executing, BlockOpensResultSets) {
         ASSERT_EQ(Prepare("begin open :c for select a, :x from t; end;"), 0);
         sb4 x = 77;
         ASSERT_EQ(BindName("c", {&element, 8, static_cast<ub2>(descriptor ? SQLT_RSET : SQLT_CUR)}), 0);
-        ASSERT_EQ(BindName("x", Int(x)), 0);
-        ASSERT_EQ(Execute(), 0);
+        MUST(BindName("x", Int(x)), Execute());
         ASSERT_NE(element, nullptr);
         ASSERT_EQ(Answer(OCIResultSetToStmt(reinterpret_cast<OCIResult*>(element), err)), 0);
         OCIStmt* const block = std::exchange(stmt, element);
@@ -224,8 +216,7 @@ TEST_F(Executing, BlockOpensResultSets) {
         const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, svc, OCI_HTYPE_SVCCTX);
         EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), 1u);
         sb4 values[2] = {};
-        ASSERT_EQ(Define(1, Int(values[0])) + Define(2, Int(values[1])), 0);
-        EXPECT_EQ(Fetch(), 0);
+        MUST(Define(1, Int(values[0])) + Define(2, Int(values[1])), Fetch());
         EXPECT_EQ(values[0], 5);
         EXPECT_EQ(values[1], 77);
         EXPECT_EQ(Fetch(), 1403);

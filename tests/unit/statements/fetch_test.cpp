@@ -57,8 +57,7 @@ TEST_F(Fetching, WhatIsWrongWithTheCall) {
     EXPECT_EQ(Answer(OCIStmtFetch2(stmt, err, 1, OCI_FETCH_NEXT, 0, 8)), 24300);
     EXPECT_EQ(Fetch(0), 0) << "gives the rest up";
     EXPECT_EQ(Fetch(), 1002);
-    ASSERT_EQ(Execute(0), 0);
-    ASSERT_EQ(Define(65535, Int(ids_)), 0);
+    MUST(Execute(0), Define(65535, Int(ids_)));
     EXPECT_EQ(Fetch(), 1007);
     for (const ub4 position : {0u, 65536u}) EXPECT_EQ(Define(position, Int(ids_)), 24308) << position;
     ASSERT_EQ(Query("select id from t", {}, 0), 0);
@@ -175,8 +174,7 @@ TEST_F(Fetching, DefinesMayBeMadeAnewAndFreed) {
     EXPECT_EQ(wide, 2);
     OCIDefine* define = nullptr;
     double real = 0;
-    ASSERT_EQ(Define(&define, 1, {&real, 8, SQLT_FLT}), 0);
-    EXPECT_EQ(OCIHandleFree(define, OCI_HTYPE_DEFINE), OCI_SUCCESS);
+    MUST(Define(&define, 1, {&real, 8, SQLT_FLT}), OCIHandleFree(define, OCI_HTYPE_DEFINE));
     wide = -1;
     ASSERT_EQ(Fetch(1), 0) << "the other column is still defined";
     EXPECT_EQ(wide, -1);

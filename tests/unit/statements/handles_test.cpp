@@ -33,16 +33,14 @@ TEST_F(Handles, OneVariableForTwoStatements) {
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(out[0], 50);
     bind = own;
-    ASSERT_EQ(Prepare("select :1 * 10, :2 from dual"), 0);
-    ASSERT_EQ(Bind(&bind, 2, Int(in[1])), 0);
+    MUST(Prepare("select :1 * 10, :2 from dual"), Bind(&bind, 2, Int(in[1])));
     EXPECT_EQ(bind, own) << "free again, with its text gone";
     EXPECT_EQ(Execute(0), 1008);
     ASSERT_EQ(OCIHandleFree(first, OCI_HTYPE_STMT), OCI_SUCCESS);
     stmt = New<OCIStmt>(OCI_HTYPE_STMT);
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_HANDLE_POSITION, own, OCI_HTYPE_BIND), 2u) << "lives on without its statement";
     EXPECT_EQ(Answer(OCIStmtSetPieceInfo(own, OCI_HTYPE_BIND, err, in, nullptr, 0, nullptr, nullptr)), 24370);
-    ASSERT_EQ(Prepare("select :1 from dual"), 0);
-    ASSERT_EQ(Bind(&bind, 1, Int(in[1])), 0);
+    MUST(Prepare("select :1 from dual"), Bind(&bind, 1, Int(in[1])));
     EXPECT_EQ(bind, own);
 }
 
@@ -51,8 +49,7 @@ TEST_F(Handles, TheOneBeforeGoesWhenNothingElseHasIt) {
     ASSERT_EQ(Prepare("select :a + :a from dual"), 0);
     sb4 one = 1, two = 2, out = 0;
     OCIBind* by_name = nullptr;
-    ASSERT_EQ(BindName(&by_name, ":a", Int(one)) + Bind(2, Int(two)) + Define(1, Int(out)), 0);
-    ASSERT_EQ(Execute(1), 0);
+    MUST(BindName(&by_name, ":a", Int(one)) + Bind(2, Int(two)) + Define(1, Int(out)), Execute(1));
     EXPECT_EQ(out, 3);
     EXPECT_EQ(Attribute<ub4>(OCI_ATTR_HANDLE_POSITION, by_name, OCI_HTYPE_BIND), 1u);
     ASSERT_EQ(Bind(1, Int(two)), 0);
@@ -79,11 +76,9 @@ TEST_F(Handles, CharacterSets) {
         EXPECT_EQ(Attribute<ub2>(OCI_ATTR_CHARSET_ID, define, OCI_HTYPE_DEFINE), c.answer == 0 ? c.id : 0);
         ASSERT_EQ(Execute(1), 0);
         EXPECT_EQ(std::string(text, length), c.text) << c.id;
-        ASSERT_EQ(Prepare("select hex(:1) from dual"), 0);
-        ASSERT_EQ(Bind(&bind, 1, {text, length, SQLT_CHR}), 0);
+        MUST(Prepare("select hex(:1) from dual"), Bind(&bind, 1, {text, length, SQLT_CHR}));
         EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &id, 0, OCI_ATTR_CHARSET_ID, err)), c.answer) << c.id;
-        ASSERT_EQ(Define(1, Text(seen)), 0);
-        ASSERT_EQ(Execute(1), 0);
+        MUST(Define(1, Text(seen)), Execute(1));
         EXPECT_STREQ(seen, c.back) << c.id;
     }
 }

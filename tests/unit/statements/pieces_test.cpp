@@ -289,8 +289,7 @@ TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
 TEST_F(PieceByPiece, HandlesThatAreFreedMeanwhile) {
     ASSERT_EQ(Prepare("select 'abc' from dual"), 0);
     OCIDefine* define = nullptr;
-    ASSERT_EQ(Define(&define, 1, InPieces(SQLT_CHR)), 0);
-    ASSERT_EQ(Execute(0), 0);
+    MUST(Define(&define, 1, InPieces(SQLT_CHR)), Execute(0));
     ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
     ASSERT_EQ(OCIHandleFree(define, OCI_HTYPE_DEFINE), OCI_SUCCESS);
     Wanted wanted;
@@ -320,9 +319,7 @@ TEST_F(PieceByPiece, ADefineFreedBeforeItsTurn) {
     ASSERT_EQ(Prepare("select 'abc', 'def' from dual union all select 'ghi', 'jkl' from dual"), 0);
     OCIDefine* first = nullptr;
     OCIDefine* second = New<OCIDefine>(OCI_HTYPE_DEFINE);
-    ASSERT_EQ(Define(&first, 1, InPieces(SQLT_CHR)), 0);
-    ASSERT_EQ(Define(&second, 2, InPieces(SQLT_CHR)), 0);
-    ASSERT_EQ(Execute(0), 0);
+    MUST(Define(&first, 1, InPieces(SQLT_CHR)), Define(&second, 2, InPieces(SQLT_CHR)), Execute(0));
     ASSERT_EQ(FetchCode(), OCI_NEED_DATA);
     sword rc = 0;
     EXPECT_EQ(Piece(2, rc), "ab");

@@ -13,6 +13,7 @@
 
 #include "kelpci.h"
 #include "oci.h"
+#include "support/must.h"
 #include "support/postgres_database.h"
 
 constexpr ub4 kHuge = 0xFFFFFFFF;    // a length that nobody means

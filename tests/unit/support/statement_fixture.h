@@ -16,6 +16,7 @@
 
 #include "kelpci.h"
 #include "oci.h"
+#include "support/must.h"
 #include "support/postgres_database.h"
 
 // The calls, on handles that each thread may have of its own.

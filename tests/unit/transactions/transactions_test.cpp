@@ -36,8 +36,7 @@ protected:
 };
 
 TEST_F(Transactions, ResumingWaitsForAnotherThread) {
-    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
-    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
     std::thread other([&] {
         auto* const err = NewHandle<OCIError>(env_, OCI_HTYPE_ERROR);
         EXPECT_EQ(Answer(OCITransStart(svc_[1], err, 0, OCI_TRANS_RESUME), err), 25351);
@@ -53,14 +52,12 @@ TEST_F(Transactions, ResumingWaitsForAnotherThread) {
 }
 
 TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
-    ASSERT_EQ(Start(0, 1, OCI_TRANS_NEW), 0);
-    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    MUST(Start(0, 1, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
     ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
     auto* branch = Attribute<OCITrans*>(svc_[1], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
     XID coupled{5, 2, 1, "txc"};
     ASSERT_EQ(Answer(OCIAttrSet(branch, OCI_HTYPE_TRANS, &coupled, sizeof coupled, OCI_ATTR_XID, err_)), 0);
-    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW), 0);
-    ASSERT_EQ(Answer(OCITransDetach(svc_[1], err_, OCI_DEFAULT)), 0);
+    MUST(Start(1, 60, OCI_TRANS_NEW), Answer(OCITransDetach(svc_[1], err_, OCI_DEFAULT)));
     EXPECT_EQ(Run(1, "insert into t values(2)"), 0) << "waits for the lock";
     EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
     EXPECT_EQ(OCITransMultiPrepare(svc_[1], 1, &branch, &err_), OCI_ERROR);
@@ -70,8 +67,7 @@ TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
 }
 
 TEST_F(Transactions, OfAnotherUser) {
-    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
-    ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    MUST(Start(0, 0, OCI_TRANS_NEW | OCI_TRANS_LOOSE), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
     auto* branch = Attribute<OCITrans*>(svc_[1], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
     ASSERT_EQ(Answer(OCILogoff(svc_[1], err_)), 0);
     ASSERT_EQ(LogOn(&svc_[1], "bank", "ann", "secret"), 0) << "the owner from now on";
@@ -90,8 +86,7 @@ TEST_F(Transactions, OfAnotherUser) {
 
 // A session that goes without a word takes its branch with it; a result does not outlive the connection.
 TEST_F(Transactions, SessionsThatGo) {
-    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
-    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
     EXPECT_EQ(Answer(OCILogoff(svc_[0], err_)), 2089);
     EXPECT_EQ(OCIHandleFree(svc_[0], OCI_HTYPE_SVCCTX), OCI_SUCCESS);
     EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24756);
@@ -110,11 +105,8 @@ TEST_F(Transactions, SessionsThatGo) {
 }
 
 TEST_F(Transactions, BranchesInMemoryStayWhereTheyAre) {
-    ASSERT_EQ(Answer(OCILogoff(svc_[0], err_)), 0);
-    ASSERT_EQ(LogOn(&svc_[0], ":memory:"), 0);
-    ASSERT_EQ(Run(0, "create table t(n number)"), 0);
-    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
-    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    MUST(Answer(OCILogoff(svc_[0], err_)), LogOn(&svc_[0], ":memory:"), Run(0, "create table t(n number)"));
+    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
     EXPECT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 24782);
     EXPECT_EQ(Answer(OCITransPrepare(svc_[0], err_, OCI_DEFAULT)), 24782);
     EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_TRANS_TWOPHASE)), 24768);
@@ -133,8 +125,7 @@ TEST_F(Transactions, SeveralAreReadiedInOneCall) {
     };
     const auto prepare = [&] { return OCITransMultiPrepare(svc_[1], 2, branches, errors); };
     name("txc");
-    ASSERT_EQ(Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
-    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
+    MUST(Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), Run(0, "insert into t values(1)"));
     ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
     EXPECT_EQ(prepare(), OCI_ERROR);
     EXPECT_EQ(FirstCode(errors[0]), 25351) << "another session works in it";
@@ -143,13 +134,10 @@ TEST_F(Transactions, SeveralAreReadiedInOneCall) {
     std::swap(branches[0], branches[1]);
     EXPECT_EQ(prepare(), OCI_ERROR) << "whichever of them fails";
     std::swap(branches[0], branches[1]);
-    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
-    ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    MUST(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
     EXPECT_EQ(prepare(), OCI_SUCCESS_WITH_INFO) << "ready, and changed nothing";
-    ASSERT_EQ(Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)), 0);
-    ASSERT_EQ(Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
-    ASSERT_EQ(Run(0, "insert into t values(1)"), 0);
-    ASSERT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 0);
+    MUST(Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)), Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE));
+    MUST(Run(0, "insert into t values(1)"), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
     name("tyc");
     EXPECT_EQ(prepare(), OCI_ERROR);
     EXPECT_EQ(FirstCode(errors[0]), 0);
@@ -174,8 +162,7 @@ TEST_F(Transactions, SeveralAreReadiedInOneCall) {
 TEST_F(Transactions, TheFirstPhaseChecksWhatWasDeferred) {
     ASSERT_EQ(Run(0, "create table p(id integer primary key)"), 0);
     ASSERT_EQ(Run(0, "create table c(id integer references p deferrable initially deferred)"), 0);
-    ASSERT_EQ(Start(0, 0, OCI_TRANS_NEW), 0);
-    ASSERT_EQ(Run(0, "insert into c values(7)"), 0);
+    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into c values(7)"));
     EXPECT_EQ(Answer(OCITransPrepare(svc_[0], err_, OCI_DEFAULT)), 2091);
     EXPECT_EQ(Answer(OCITransCommit(svc_[1], err_, OCI_TRANS_TWOPHASE)), 24756);
 }

@@ -234,8 +234,7 @@ TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
     EXPECT_EQ(Answer(OCIAttrSet(named, OCI_HTYPE_TRANS, &name, sizeof name, OCI_ATTR_XID, err_)), 0);
     EXPECT_EQ(Answer(OCITransMultiPrepare(xaoSvcCtx(nullptr), 1, &named, &err_)), 2089) << "the manager's to prepare";
     ASSERT_EQ(Call(kEnd, xid, TMSUCCESS, 3), XA_OK);
-    EXPECT_EQ(Change(), 0);
-    EXPECT_EQ(OCITransRollback(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT), OCI_SUCCESS);
+    SHOULD(Change(), OCITransRollback(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT));
     EXPECT_EQ(Call(kStart, xid, TMJOIN, 3), XA_RBTIMEOUT);
     EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_RBTIMEOUT);
     EXPECT_EQ(Code(), -2049);
@@ -259,9 +258,7 @@ TEST_F(XaCalls, VersionSevenOnTheSessionsOfManagers) {
     EXPECT_EQ(adopt("one", -2), 1012);
     EXPECT_EQ(adopt("one", 2), 1012);
     EXPECT_EQ(adopt("one", 0), 1012) << "there is none without a name";
-    EXPECT_EQ(adopt("onetwo", 3), 0);
-    EXPECT_EQ(parse("insert into t values(1)"), 0);
-    EXPECT_EQ(oexec(&cursor), 0);
+    SHOULD(adopt("onetwo", 3), parse("insert into t values(1)"), oexec(&cursor));
     EXPECT_EQ(Call(kStart, Named("a", "b"), TMNOFLAGS), XAER_OUTSIDE) << "the very session";
     EXPECT_EQ(orol(&login), 0);
     EXPECT_EQ(Call(kStart, Named("a", "b"), TMNOFLAGS), XA_OK);
@@ -281,9 +278,7 @@ TEST_F(XaCalls, VersionSevenOnTheSessionsOfManagers) {
     // What is under way when the manager is closed is given up.
     ASSERT_EQ(Open(3, "SqlNet=three"), XA_OK);
     sqllda(&login);
-    EXPECT_EQ(parse("create table t(v varchar2(9))"), 0);
-    EXPECT_EQ(oexec(&cursor), 0);
-    EXPECT_EQ(parse("insert into t values(:v)"), 0);
+    SHOULD(parse("create table t(v varchar2(9))"), oexec(&cursor), parse("insert into t values(:v)"));
     EXPECT_EQ(obindps(&cursor, 0, Text(":v"), -1, nullptr, 10, SQLT_CHR, -1, nullptr, nullptr, nullptr, 0, 0, 0, 0, 0,
                       nullptr, nullptr, -1, -1), 0);
     EXPECT_EQ(oopt(&cursor, 0, 4), 0);
@@ -293,8 +288,7 @@ TEST_F(XaCalls, VersionSevenOnTheSessionsOfManagers) {
     EXPECT_EQ(oexec(&cursor), 1012);
     EXPECT_EQ(obreak(&login), 3114);
     EXPECT_EQ(ocom(&login), 1012);
-    EXPECT_EQ(ologof(&login), 0);
-    ASSERT_EQ(olog(&login, nullptr, nullptr, 0, nullptr, 0, Text("three"), 5, 0), 0);
+    MUST(ologof(&login), olog(&login, nullptr, nullptr, 0, nullptr, 0, Text("three"), 5, 0));
     EXPECT_EQ(adopt("one", 3), 1015) << "no manager's: it stays what it is";
     EXPECT_EQ(ologof(&login), 0);
 }
@@ -334,8 +328,7 @@ TEST_F(XaOfProcesses, NamesThatAreTaken) {
     EXPECT_EQ(Answer(OCITransStart(svc, err_, 0, OCI_TRANS_NEW)), 24757);
     EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), XA_OK);
     EXPECT_EQ(Answer(OCITransStart(svc, err_, 0, OCI_TRANS_NEW)), 0) << "the name is free";
-    EXPECT_EQ(Answer(OCITransRollback(svc, err_, OCI_DEFAULT)), 0);
-    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    SHOULD(Answer(OCITransRollback(svc, err_, OCI_DEFAULT)), Answer(OCILogoff(svc, err_)));
 }
 
 }  // namespace

@@ -184,8 +184,7 @@ TEST_F(Conversions, SinglePrecisionColumns) {
     MustRun("create table r(f binary_float)");
     for (const float value : {0.1f, 3.4028235e38f, 1.17549435e-38f, 16777216.0f, -1.5f}) {
         MustRun("delete from r");
-        ASSERT_EQ(Ready("insert into r values(:1)", {{const_cast<float*>(&value), 4, SQLT_IBFLOAT}}), 0);
-        ASSERT_EQ(Execute(), 0);
+        MUST(Ready("insert into r values(:1)", {{const_cast<float*>(&value), 4, SQLT_IBFLOAT}}), Execute());
         float single = 0;
         double wide = 0;
         OCINumber number{};
@@ -215,21 +214,17 @@ TEST_F(Conversions, SignsOfPackedDecimals) {
 TEST_F(Conversions, PackedDecimalWithScale) {
     OCIDefine* define = nullptr;
     char area[4] = "";
-    ASSERT_EQ(Prepare("select -123.456 from dual"), 0);
-    ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
+    MUST(Prepare("select -123.456 from dual"), Define(&define, 1, {area, 4, SQLT_PDN}));
     ub2 precision = 5;
     sb2 scale = 2;
     ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &precision, 0, OCI_ATTR_PDPRC, err)), 0);
-    ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &scale, 0, OCI_ATTR_PDSCL, err)), 0);
-    ASSERT_EQ(Execute(1), 0);
+    MUST(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &scale, 0, OCI_ATTR_PDSCL, err)), Execute(1));
     EXPECT_EQ(Hex(std::string(area, 4)), "0012346D");
-    ASSERT_EQ(Prepare("select 1234.5 from dual"), 0);
-    ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
+    MUST(Prepare("select 1234.5 from dual"), Define(&define, 1, {area, 4, SQLT_PDN}));
     EXPECT_EQ(Execute(1), 1457) << "six digits, and the precision is five";
     precision = 1;
     ASSERT_EQ(Answer(OCIAttrSet(define, OCI_HTYPE_DEFINE, &precision, 0, OCI_ATTR_PDPRC, err)), 0);
-    ASSERT_EQ(Prepare("select 0.12 from dual"), 0);
-    ASSERT_EQ(Define(&define, 1, {area, 4, SQLT_PDN}), 0);
+    MUST(Prepare("select 0.12 from dual"), Define(&define, 1, {area, 4, SQLT_PDN}));
     EXPECT_EQ(Execute(1), 1457);
 }
 
@@ -262,8 +257,7 @@ TEST_F(Conversions, Dates) {
     EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT), "!1841");
     OCIDate old{-44, 3, 15, {0, 0, 0}};
     MustRun("delete from d");
-    ASSERT_EQ(Ready("insert into d(d) values(:1)", {{&old, sizeof old, SQLT_ODT}}), 0);
-    EXPECT_EQ(Execute(), 0);
+    MUST(Ready("insert into d(d) values(:1)", {{&old, sizeof old, SQLT_ODT}}), Execute());
     EXPECT_EQ(One("select d from d"), "15-MAR-44");
 }
 
@@ -579,8 +573,7 @@ TEST_F(Utf16Conversions, CharacterDataIsUtf16) {
     char out[10] = "";
     ASSERT_EQ(Ready("select length(:1), :2 from dual",
                     {{in.data(), 6, SQLT_CHR}, {terminated.data(), 6, SQLT_STR}}), 0);
-    ASSERT_EQ(Define(1, Int(count)) + Define(2, Text(out)), 0);
-    ASSERT_EQ(Execute(1), 0);
+    MUST(Define(1, Int(count)) + Define(2, Text(out)), Execute(1));
     EXPECT_EQ(count, 3);
     EXPECT_EQ(std::string(out, 6), terminated);
     in = {'\0', '\xD8'};
