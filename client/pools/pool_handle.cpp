@@ -154,7 +154,7 @@ Status PoolHandle::CreatePool(Request request) {
     if (status.Ok()) status = MakePool(request, creation.pool);
     if (status.Failed()) return status;
     if (fill) status = creation.pool->Fill();
-    const bool bad_user = status.Number() == errors::kBadLogon || status.Number() == errors::kNoPassword;
+    const bool bad_user = status.Number() == errors::kBadLogon;
     if (status.Failed()) return bad_user && numbers_.bad_user ? Error(numbers_.bad_user, status.Detail()) : status;
     creation.name =
         NewName(Env(), Type() == OCI_HTYPE_SPOOL ? Kind::session_pool : Kind::connection_pool, creation.pool);

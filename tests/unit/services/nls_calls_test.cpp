@@ -30,7 +30,8 @@ TEST_F(NlsCalls, TextsAreConverted) {
     const struct { ub2 to, from; std::string_view text; size_t room; sb4 answer; std::string_view result; } edges[] = {
         {31, 873, "€😁é", 9, 0, "??\xe9"}, {1, 873, "é", 9, 0, "?"}, {873, 1, "\x80", 9, 24501, ""},
         {873, 178, "\x81", 9, 24501, ""}, {31, 873, "\xc3", 9, 24501, ""}, {873, 31, "a\xe9", 2, 22059, "a"},
-        {2000, 873, "\U0010FFFF", 3, 22059, ""}, {7, 873, "a", 9, 24329, ""}, {873, 873, "ab", 0, 22059, ""}};
+        {2000, 873, "\U0010FFFF", 3, 22059, ""}, {7, 873, "a", 9, 24329, ""}, {873, 873, "ab", 0, 22059, ""},
+        {2000, 873, "longer than one", 1, 22059, ""}};
     for (const auto& c : edges) {
         char area[10] = "";
         size_t length = 0;

@@ -125,9 +125,9 @@ protected:
     OCIEnv* env_ = nullptr;
     OCIError* err_ = nullptr;
     std::string ann_ = "ann";
+    std::unique_ptr<PostgresDatabase> server_;    // null for a file
 
 private:
-    std::unique_ptr<PostgresDatabase> server_;
     ub4 mode_;
     std::string folder_;
     alignas(16) char bogus_[16] = "no such object!";

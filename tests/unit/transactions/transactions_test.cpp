@@ -158,13 +158,18 @@ TEST_F(Transactions, SeveralAreReadiedInOneCall) {
     EXPECT_EQ(Run(1, "insert into t select 1 / count(*) from t"), 0);
 }
 
-// A promise that a deferred foreign key would break is not given.
-TEST_F(Transactions, TheFirstPhaseChecksWhatWasDeferred) {
-    ASSERT_EQ(Run(0, "create table p(id integer primary key)"), 0);
-    ASSERT_EQ(Run(0, "create table c(id integer references p deferrable initially deferred)"), 0);
-    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into c values(7)"));
-    EXPECT_EQ(Answer(OCITransPrepare(svc_[0], err_, OCI_DEFAULT)), 2091);
-    EXPECT_EQ(Answer(OCITransCommit(svc_[1], err_, OCI_TRANS_TWOPHASE)), 24756);
+// A deferred foreign key that is broken ends the branch, in the first phase as in the only one.
+TEST_F(Transactions, WhatWasDeferredIsChecked) {
+    MUST(Run(0, "create table p(id integer primary key)"),
+         Run(0, "create table c(id integer references p deferrable initially deferred)"));
+    for (const auto end : {OCITransPrepare, OCITransCommit}) {
+        MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into c values(7)"));
+        EXPECT_EQ(Answer(end(svc_[0], err_, OCI_DEFAULT)), 2091);
+        EXPECT_EQ(Answer(OCITransCommit(svc_[1], err_, OCI_TRANS_TWOPHASE)), 24756);
+        EXPECT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 25352);
+        SHOULD(Run(0, "insert into p select 1 / (case count(*) when 0 then 1 else 0 end) from c"),
+               Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)));
+    }
 }
 
 }  // namespace

@@ -100,6 +100,22 @@ TEST_F(XaCalls, EachCallInEachState) {
     }
 }
 
+// A broken constraint that was deferred ends the branch in one phase and in two.
+TEST_F(XaCalls, WhatWasDeferredIsChecked) {
+    MUST(Run("one", "create table p(id integer primary key)"),
+         Run("one", "create table c(id integer references p deferrable initially deferred)"));
+    const XID xid = Named("deferred", "x");
+    for (const bool one_phase : {false, true}) {
+        MUST(Call(kStart, xid, TMNOFLAGS), Run("one", "insert into c values(7)"), Call(kEnd, xid, TMSUCCESS));
+        const int code = one_phase ? Call(kCommit, xid, TMONEPHASE) : Call(kPrepare, xid, TMNOFLAGS);
+        EXPECT_EQ(code, OnServer() && !one_phase ? XA_RBINTEGRITY : XA_RBROLLBACK);
+        EXPECT_EQ(Code(), OnServer() && !one_phase ? -2291 : -2091);
+        EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), XAER_NOTA);
+    }
+    SHOULD(Run("one", "insert into p select 1 / (case count(*) when 0 then 1 else 0 end) from c"),
+           OCITransRollback(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT));
+}
+
 TEST_F(XaCalls, ArgumentsAreJudgedFirst) {
     const XID good = Named("g", "b");
     const struct { int (*xa_switch_t::*entry)(XID*, int, xa_long); XID xid; xa_long flags; int rmid; int code; } cases[] = {
@@ -223,8 +239,18 @@ TEST_F(XaCalls, ThreadsOfControl) {
     EXPECT_EQ(OCITransCommit(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT), OCI_SUCCESS);
 }
 
-// The other manager's change waits for the lock of the branch that rests, and gets it when its time is over.
+// The other manager's change waits for the lock of the branch that rests, and gets it when its time is over. What has
+// prepared, and who works again, has all the time there is.
 TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
+    const XID others[] = {Named("ready", "x"), Named("taken up", "x")};
+    for (const int index : {0, 1}) {
+        const int rmid = 4 + index;
+        const std::string name = std::to_string(rmid);
+        MUST(Open(rmid, "SesTm=1+DB=" + name), Run(name.c_str(), "create table t(n number)"));
+        MUST(Call(kStart, others[index], TMNOFLAGS, rmid), Run(name.c_str(), "insert into t values(1)"));
+        ASSERT_EQ(Call(kEnd, others[index], TMSUCCESS, rmid), XA_OK);
+        EXPECT_EQ(index == 0 ? Call(kPrepare, others[0], TMNOFLAGS, 4) : Call(kStart, others[1], TMJOIN, 5), XA_OK);
+    }
     ASSERT_EQ(Open(3, "SqlNet=one+SesTm=1"), XA_OK);
     const XID xid = Named("time", "x");
     ASSERT_EQ(Call(kStart, xid, TMNOFLAGS, 3), XA_OK);
@@ -238,7 +264,9 @@ TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
     EXPECT_EQ(Call(kStart, xid, TMJOIN, 3), XA_RBTIMEOUT);
     EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_RBTIMEOUT);
     EXPECT_EQ(Code(), -2049);
-    EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
+    EXPECT_EQ(Call(kCommit, others[0], TMNOFLAGS, 4), XA_OK);
+    SHOULD(Call(kEnd, others[1], TMSUCCESS, 5), Call(kCommit, others[1], TMONEPHASE, 5));
+    for (const int rmid : {3, 4, 5}) EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, rmid, TMNOFLAGS), XA_OK);
 }
 
 // An area on a manager's session: by the manager's name, and given up without an end of the session.
@@ -291,6 +319,22 @@ TEST_F(XaCalls, VersionSevenOnTheSessionsOfManagers) {
     MUST(ologof(&login), olog(&login, nullptr, nullptr, 0, nullptr, 0, Text("three"), 5, 0));
     EXPECT_EQ(adopt("one", 3), 1015) << "no manager's: it stays what it is";
     EXPECT_EQ(ologof(&login), 0);
+}
+
+// A connection that was lost with its branch serves no other branch.
+TEST_F(XaCalls, ABranchThatTheServerHasLost) {
+    const XID xid = Named("lost", "x");
+    for (const bool lost : {OnServer(), false}) {
+        ASSERT_EQ(Call(kStart, xid, TMNOFLAGS), XA_OK);
+        ASSERT_EQ(Change(), 0) << lost;
+        ASSERT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK);
+        if (lost) {
+            EXPECT_EQ(server_->RunHere("select count(pg_terminate_backend(pid, 9000)) from pg_stat_activity"
+                                       " where datname = current_database() and state = 'idle in transaction'"), "1");
+        }
+        EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), lost ? XAER_RMFAIL : XA_OK);
+        EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), XAER_NOTA);
+    }
 }
 
 class XaOfProcesses : public XaCalls {
