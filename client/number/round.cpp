@@ -123,9 +123,9 @@ Errno Shift(const OCINumber& value, int digits, OCINumber* result) noexcept {
         const Digits source = parts;
         const bool longer = DigitAt(source, 0) >= 10;
         parts.exponent += longer;
-        for (int i = 0; i < kUnpackedDigits; ++i) {
+        for (int i = 0; i <= kMantissaDigits; ++i) {  // a number has no digit behind these
             const int left = longer ? (i == 0 ? 0 : DigitAt(source, i - 1)) : DigitAt(source, i);
-            const int right = longer ? DigitAt(source, i) : (i + 1 < kUnpackedDigits ? DigitAt(source, i + 1) : 0);
+            const int right = DigitAt(source, longer ? i : i + 1);
             SetDigit(&parts, i, left % 10 * 10 + right / 10);
         }
     }

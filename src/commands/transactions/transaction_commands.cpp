@@ -48,7 +48,7 @@ void Commit(const CommandRow& row, int count, char** words) {
 // The one return code is reported against the error handle of every branch.
 void PrepareBranches(const CommandRow& row, int count, char** words) {
     const int branches = DecodeNumber(words[2]);
-    if (branches < 0 || (count - 3) % 2 != 0 || (count - 3) / 2 != branches) return InvalidSyntax(row.usage);
+    if ((count - 3) % 2 != 0 || (count - 3) / 2 != branches) return InvalidSyntax(row.usage);
     auto* const svc = Resolve<OCISvcCtx>(Kind::svc, words[1]);
     const auto room = static_cast<size_t>(std::max(branches, 1)) * sizeof(void*);
     const Memory<OCITrans*> transactions(static_cast<OCITrans**>(GetMem(room)));

@@ -179,7 +179,7 @@ TEST(Values, SevenByteDatesThatArePossible) {
         {{120, 124, 4, 31, 1, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 0, 1, 1}, "Invalid date found\n"},
         {{120, 124, 1, 1, 25, 1, 1}, "Invalid date found\n"}, {{120, 124, 1, 1, 1, 61, 1}, "Invalid date found\n"},
         {{120, 124, 1, 1, 1, 1, 61}, "Invalid date found\n"}, {{119, 100, 2, 29, 1, 1, 1}, "Invalid date found\n"},
-        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"},
+        {{120, 100, 2, 29, 1, 1, 1}, "\"2000-02-29-00:00:00\"\n"}, {{120, 100, 2, 30, 1, 1, 1}, "Invalid date found\n"},
         {{100, 99, 2, 29, 1, 1, 1}, "\"-001-02-29-00:00:00\"\n"}, {{100, 96, 2, 29, 1, 1, 1}, "Invalid date found\n"}};
     for (const auto& c : cases) {
         Element element(SQLT_DAT, 7);
