@@ -21,8 +21,7 @@ struct Plan {
 
 // What became of the plan since it was set.
 struct Outcome {
-    long counted = 0;
-    long failed = 0;
+    long counted = 0, failed = 0;
     std::string first;    // what failed first, as "operator new, 64 bytes"
 };
 

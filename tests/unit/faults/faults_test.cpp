@@ -20,11 +20,7 @@ namespace {
 
 constexpr long kTooMany = 100000;
 
-struct Case {
-    Scenario scenario;
-    Whose whose;
-    How how;
-};
+struct Case { Scenario scenario; Whose whose; How how; };
 
 void PrintTo(const Case& c, std::ostream* out) { *out << c.scenario.name; }
 

@@ -50,15 +50,12 @@ void ShowRest(World& w, Rows& rows) {
 
 void ShowAll(World& w, Rows& rows) {
     sword code = OCI_SUCCESS;
-    try {
+    Attempt([&] {
         while (code == OCI_SUCCESS) {
             code = w.Fetch(6);
             rows.Show(w, RowsFetched(w));
         }
-    } catch (const Stopped&) {
-        ShowRest(w, rows);
-        throw;
-    }
+    }, [&] { ShowRest(w, rows); });
 }
 
 void FetchArrays(World& w) {
@@ -82,14 +79,11 @@ void FetchAhead(World& w) {
     w.Execute(0, mode);
     w.Fetch(6);
     rows.Show(w, RowsFetched(w));
-    try {
+    Attempt([&] {
         const Instead of_query(w.stmt, w.New<OCIStmt>(OCI_HTYPE_STMT));
         w.Run("insert into other values(1)");
         w.Keeps("select count(*) from other", "2");
-    } catch (const Stopped&) {
-        ShowRest(w, rows);
-        throw;
-    }
+    }, [&] { ShowRest(w, rows); });
     ShowAll(w, rows);
 }
 
@@ -102,16 +96,13 @@ void Scroll(World& w) {
         {2, OCI_FETCH_NEXT, 0}, {1, OCI_FETCH_LAST, 0}, {3, OCI_FETCH_ABSOLUTE, 12}, {2, OCI_FETCH_FIRST, 0},
         {1, OCI_FETCH_RELATIVE, 3}, {1, OCI_FETCH_PRIOR, 0}};
     for (const auto& move : moves) {
-        try {
-            w.Fetch(move.count, move.orientation, move.offset);
-        } catch (const Stopped&) {
+        Attempt([&] { w.Fetch(move.count, move.orientation, move.offset); }, [&] {
             if (OCIStmtFetch2(w.stmt, w.err, 1, OCI_FETCH_ABSOLUTE, 7, OCI_DEFAULT) == OCI_SUCCESS) {
                 w.seen.clear();
                 rows.Show(w, 1);
                 EXPECT_EQ(w.seen, "7,") << "after a fetch that failed";
             }
-            throw;
-        }
+        });
         rows.Show(w, RowsFetched(w));
         w.See("");
     }

@@ -107,13 +107,10 @@ void UndoneWhole(World& w) {
     Number(w, "oopt", [&] { return oopt(&areas->cursor, 0, 4); });
     BindValue(w, *areas, "n", numbers, 4, SQLT_INT);
     for (const sword rows : {4, 3}) {
-        try {
-            Number(w, "oexn", [&] { return oexn(&areas->cursor, rows, 0); }, {rows == 4 ? 1 : 0});
-        } catch (const Stopped&) {
+        Attempt([&] { Number(w, "oexn", [&] { return oexn(&areas->cursor, rows, 0); }, {rows == 4 ? 1 : 0}); }, [&] {
             EXPECT_EQ(areas->cursor.rpc, 0u);
             EXPECT_LE(Count(*areas), 1);    // 0: the engine had to roll the transaction back
-            throw;
-        }
+        });
         w.See(areas->cursor.rpc);
     }
     w.See(Count(*areas));
@@ -123,30 +120,24 @@ void UndoneWhole(World& w) {
         return obindps(&areas->cursor, 0, Words("c"), -1, reinterpret_cast<ub1*>(&length), 10, SQLT_CHR, -1, nullptr,
                        nullptr, nullptr, 0, 0, 0, 0, 0, nullptr, nullptr, -1, -1);
     });
-    try {
+    Attempt([&] {
         for (int row = 0; row < 2; ++row) {
             Number(w, "oexn", [&] { return oexn(&areas->cursor, 2, 0); }, {3129});
             Number(w, "osetpi", [&] { return osetpi(&areas->cursor, OCI_ONE_PIECE, Words("ab"), &length); });
         }
         Number(w, "oexn", [&] { return oexn(&areas->cursor, 2, 0); }, {1});
-    } catch (const Stopped&) {
+    }, [&] {
         EXPECT_EQ(ocan(&areas->cursor), 0);
         const int left = Count(*areas);
         EXPECT_TRUE(left == 4 || left == 0) << left;
-        throw;
-    }
+    });
     w.See(Count(*areas));
 }
 
 // The area tells of the failure, too.
 template <class Call>
 void Bridged(const Areas& areas, Call call) {
-    try {
-        call();
-    } catch (const Stopped&) {
-        EXPECT_EQ(areas.login.rc, kOutOfMemory);
-        throw;
-    }
+    Attempt([&] { call(); }, [&] { EXPECT_EQ(areas.login.rc, kOutOfMemory); });
 }
 
 void LoginToContext(World& w) {

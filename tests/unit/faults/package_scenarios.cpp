@@ -130,13 +130,10 @@ void Strings(World& w) {
         w.STEP(OCIStringAssignText, w.env, w.err, World::Text(text), World::Size(text), &string);
     };
     assign("hello");
-    try {
+    Attempt([&] {
         assign("a text that is too long for the room of the first");
         w.STEP(OCIStringResize, w.env, w.err, 1000, &string);
-    } catch (const Stopped&) {
-        EXPECT_TRUE(contents(string) == "hello" || contents(string).size() == 49) << contents(string);
-        throw;
-    }
+    }, [&] { EXPECT_TRUE(contents(string) == "hello" || contents(string).size() == 49) << contents(string); });
     w.STEP(OCIStringAssign, w.env, w.err, string, &copy);
     w.See(contents(copy));
 }
@@ -150,13 +147,10 @@ void Raws(World& w) {
     });
     const ub1 bytes[100] = {1, 2, 3};
     w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 3, &raw);
-    try {
+    Attempt([&] {
         w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 100, &raw);
         w.STEP(OCIRawResize, w.env, w.err, 2000, &raw);
-    } catch (const Stopped&) {
-        EXPECT_EQ(OCIRawPtr(w.env, raw)[2], 3);
-        throw;
-    }
+    }, [&] { EXPECT_EQ(OCIRawPtr(w.env, raw)[2], 3); });
     w.STEP(OCIRawAssignRaw, w.env, w.err, raw, &copy);
     w.See(OCIRawSize(w.env, copy));
 }
@@ -175,19 +169,11 @@ void Files(World& w) {
                OCI_FILE_READ_WRITE, create, OCI_FILE_BIN);
         w.AtEnd([&w, file] { return OCIFileClose(w.env, w.err, file); });
     };
-    try {
-        open(OCI_FILE_TRUNCATE);
-    } catch (const Stopped&) {
-        EXPECT_EQ(std::filesystem::file_size(path), 14u) << "emptied, though not opened";
-        throw;
-    }
+    Attempt([&] { open(OCI_FILE_TRUNCATE); },
+            [&] { EXPECT_EQ(std::filesystem::file_size(path), 14u) << "emptied, though not opened"; });
     std::filesystem::remove(path);
-    try {
-        open(OCI_FILE_EXCL);
-    } catch (const Stopped&) {
-        EXPECT_FALSE(std::filesystem::exists(path)) << "made, though not opened";
-        throw;
-    }
+    Attempt([&] { open(OCI_FILE_EXCL); },
+            [&] { EXPECT_FALSE(std::filesystem::exists(path)) << "made, though not opened"; });
     static char data[20000];
     std::memset(data, 'x', sizeof data);
     ub4 count = 0;
@@ -233,21 +219,15 @@ void Threads(World& w) {
     static int ran;
     ran = 0;
     // The system does not say whether it was memory or the number of threads: 21500 for both.
-    try {
+    Attempt([&] {
         w.Step("OCIThreadCreate", [&] {
             return OCIThreadCreate(w.env, w.err, [](dvoid* count) { ++*static_cast<int*>(count); }, &ran, id, handle);
         }, Told::error_handle, 21500);
-    } catch (const Stopped&) {
-        EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_ERROR) << "there is no thread";
-        throw;
-    }
-    try {
-        w.STEP(OCIThreadJoin, w.env, w.err, handle);
-    } catch (const Stopped&) {
+    }, [&] { EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_ERROR) << "there is no thread"; });
+    Attempt([&] { w.STEP(OCIThreadJoin, w.env, w.err, handle); }, [&] {
         EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_SUCCESS) << "asked again";
         EXPECT_EQ(OCIThreadClose(w.env, w.err, handle), OCI_SUCCESS);
-        throw;
-    }
+    });
     w.SURELY(OCIThreadClose, w.env, w.err, handle);
     w.See(ran);
 }

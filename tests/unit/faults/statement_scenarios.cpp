@@ -35,12 +35,8 @@ ub4 QuietAttribute(World& w, ub4 attribute) {
 // An array that fails on its way keeps the rows before, and says how many they are.
 sword ExecuteArray(World& w, ub4 count, ub4 mode = OCI_DEFAULT) {
     sword code = OCI_SUCCESS;
-    try {
-        code = w.Execute(count, mode);
-    } catch (const Stopped&) {
-        w.Keeps(kCount, std::to_string(1 + QuietAttribute(w, OCI_ATTR_ROW_COUNT)));
-        throw;
-    }
+    Attempt([&] { code = w.Execute(count, mode); },
+            [&] { w.Keeps(kCount, std::to_string(1 + QuietAttribute(w, OCI_ATTR_ROW_COUNT))); });
     if (code == OCI_SUCCESS) w.Keeps(kCount, std::to_string(1 + count));
     return code;
 }
@@ -368,13 +364,10 @@ void PiecesIn(World& w) {
         w.STEP(OCIStmtGetPieceInfo, w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
         ub4 length = World::Size(step.data);
         w.STEP(OCIStmtSetPieceInfo, handle, type, w.err, step.data, &length, step.piece, nullptr, nullptr);
-        try {
-            code = ExecuteArray(w, 2);
-        } catch (const Stopped&) {
+        Attempt([&] { code = ExecuteArray(w, 2); }, [&] {
             EXPECT_EQ(OCIStmtGetPieceInfo(w.stmt, w.err, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), OCI_ERROR)
                 << "an execute that failed waits for nothing";
-            throw;
-        }
+        });
     }
     EXPECT_EQ(code, OCI_SUCCESS);
     w.See(Rows(w));
@@ -444,14 +437,11 @@ void StatementCache(World& w) {
                OCI_NTV_SYNTAX, OCI_DEFAULT);
         sb4 value = 0;
         const Instead of_plain(w.stmt, statement);
-        try {
+        Attempt([&] {
             w.Define(1, {&value, 4, SQLT_INT});
             w.Execute(1);
             w.STEP(OCIStmtRelease, statement, w.err, World::Text("a key that is not short at all"), 30, OCI_DEFAULT);
-        } catch (const Stopped&) {
-            EXPECT_EQ(OCIStmtRelease(statement, w.err, nullptr, 0, OCI_DEFAULT), OCI_SUCCESS);
-            throw;
-        }
+        }, [&] { EXPECT_EQ(OCIStmtRelease(statement, w.err, nullptr, 0, OCI_DEFAULT), OCI_SUCCESS); });
         w.See(value);
     }
 }

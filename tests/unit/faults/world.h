@@ -21,6 +21,17 @@ namespace faults {
 // A step failed: the scenario is over.
 struct Stopped {};
 
+// Steps, and what holds when one of them failed; the scenario is over then all the same.
+template <class Steps, class Check>
+void Attempt(Steps steps, Check check) {
+    try {
+        steps();
+    } catch (const Stopped&) {
+        check();
+        throw;
+    }
+}
+
 // Where a failing call says why: in an error handle's record, in the environment's, or in its return code alone.
 enum class Told { error_handle, environment, code };
 
@@ -170,10 +181,8 @@ private:
     OCIError* quiet_err_ = nullptr;
     OCIStmt* quiet_ = nullptr;
     std::vector<std::function<sword()>> ends_;
-    std::string folder_;
-    std::string kept_query_;
-    std::string kept_;
-    std::string kept_rolled_back_;
+    std::string folder_, kept_query_;
+    std::string kept_, kept_rolled_back_;
     bool rolled_back_ = false;    // says the record of the step that failed
 };
 

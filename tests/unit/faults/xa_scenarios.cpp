@@ -28,17 +28,16 @@ OCISvcCtx* Session() { return xaoSvcCtx(World::Text("faults")); }
 template <class Call>
 void XaStep(World& w, const char* name, int expected, Call call) {
     int code = XA_OK;
-    try {
+    Attempt([&] {
         w.Step(name, [&] { return (code = call()) < 0 ? OCI_ERROR : OCI_SUCCESS; }, Told::code);
         EXPECT_EQ(code, expected) << name;
-    } catch (const Stopped&) {
+    }, [&] {
         SQLCA why{};
         const bool is_told = XaGetInfo(kManager, &why) == XA_OK;    // unless there was no memory for that, either
         EXPECT_EQ(code, XAER_RMERR) << name;
         EXPECT_TRUE(!is_told || why.sqlcode == -kOutOfMemory) << name << ": " << why.sqlcode;
         EXPECT_EQ(call(), expected) << name << ", repeated";
-        throw;
-    }
+    });
 }
 void BranchStep(World& w, const char* name, Entry entry, xa_long flags) {
     XaStep(w, name, XA_OK, [=] { return CallOf(entry, flags); });
