@@ -133,10 +133,8 @@ TEST(Keywords, AWordThatMatchesNothingIsANumber) {
 }
 
 TEST(Keywords, NumbersEndAtTheFirstOtherCharacter) {
-    const struct {
-        const char* word;
-        int value;
-    } cases[] = {{"12", 12}, {" -7x", -7}, {"+3", 3}, {"abc", 0}, {"", 0}, {"4294967295", -1}, {"0x10", 0}};
+    const struct { const char* word; int value; } cases[] = {
+        {"12", 12}, {" -7x", -7}, {"+3", 3}, {"abc", 0}, {"", 0}, {"4294967295", -1}, {"0x10", 0}};
     for (const auto& c : cases) EXPECT_EQ(DecodeNumber(c.word), c.value) << c.word;
 }
 

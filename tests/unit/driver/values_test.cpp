@@ -23,8 +23,7 @@ struct Element {
     uint32_t size;
     unsigned char data[64];
     int16_t indicator = 7;
-    uint16_t length = 7;
-    uint16_t return_code = 0;
+    uint16_t length = 7, return_code = 0;
     uint16_t precision = 0;
     int16_t scale = 0;
 

@@ -105,13 +105,9 @@ TEST_P(Contract, RowIdNamesItsRow) {
     ASSERT_EQ(Answer(query->Fetch(taken, 1, more)), 0);
     EXPECT_EQ(Query("select n from t where rowid = %1", {Row(taken.row)}), "2;");
 
-    engine::ArrayOutcome outcome;
     Rows none;
-    ASSERT_TRUE(Prepared("update t set n = 20 where n = 2")->ExecuteArray(none, {}, outcome).Ok());
-    EXPECT_EQ(outcome.last_row.value_or(taken.row), taken.row);
-    engine::ArrayOutcome nothing;
-    ASSERT_TRUE(Prepared("update t set n = 20 where n = 99")->ExecuteArray(none, {}, nothing).Ok());
-    EXPECT_FALSE(nothing.last_row) << "no row was touched";
+    EXPECT_EQ(Executed(*Prepared("update t set n = 20 where n = 2"), none).last_row.value_or(taken.row), taken.row);
+    EXPECT_FALSE(Executed(*Prepared("update t set n = 20 where n = 99"), none).last_row) << "no row was touched";
 }
 
 // ---- Array executions
@@ -120,8 +116,7 @@ TEST_P(Contract, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
     ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
     const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
     Rows rows{{Integer(1)}, {Integer(1)}, {Integer(2)}, {Integer(2)}, {Integer(3)}};
-    engine::ArrayOutcome stopped;
-    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 0, .last = 5}, stopped).Ok());
+    const auto stopped = Executed(*insert, rows, {.first = 0, .last = 5});
     EXPECT_EQ(stopped.executed, 1u);
     EXPECT_EQ(Failures(stopped), "1:1 ");
     EXPECT_EQ(All(), "1;") << "the row before the failure stays";
@@ -152,8 +147,7 @@ TEST_P(Contract, LongArraysKeepTheirValuesAndFailTheirRows) {
     for (const std::size_t twice : {3u, 1500u, 1501u}) rows.rows[twice][0] = Integer(0);
     rows.rows[7] = {Integer(7), Null(), Null(), Null(), Null()};
     rows.refused_row = 2400;
-    engine::ArrayOutcome outcome;
-    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 0, .last = 2500, .all_rows = true}, outcome).Ok());
+    const auto outcome = Executed(*insert, rows, {.first = 0, .last = 2500, .all_rows = true});
     EXPECT_EQ(outcome.executed, 2496u);
     EXPECT_EQ(outcome.affected, 2496u);
     EXPECT_EQ(Failures(outcome), "3:1 1500:1 1501:1 2400:1722 ");
@@ -161,15 +155,12 @@ TEST_P(Contract, LongArraysKeepTheirValuesAndFailTheirRows) {
               "7,null,null,null,null;2499,real -0.25,decimal -12345678901234567890123456789012345678,\xC3\xA4 b,"
               "time 1999-12-31 23:00:00.5;");
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
-    engine::ArrayOutcome stopped;
-    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 4, .last = 2500}, stopped).Ok());
-    EXPECT_EQ(stopped.executed, 1497u) << "0 is the first of two";
+    EXPECT_EQ(Executed(*insert, rows, {.first = 4, .last = 2500}).executed, 1497u) << "0 is the first of two";
     EXPECT_EQ(Count(), "1497;");
     ASSERT_EQ(Run("delete from t"), 0);
     rows.refused_row = 9999;
     for (auto& row : rows.rows) row = {row[0], Text("x")};
-    ASSERT_TRUE(Prepared("insert into t(n, v) values(%1 + 1, upper(%2))", std::vector{Integer(1), Text("x")})
-                    ->ExecuteArray(rows, {.first = 20, .last = 40}, outcome).Ok());
+    Executed(*Prepared("insert into t(n, v) values(%1 + 1, upper(%2))", rows.rows[0]), rows, {.first = 20, .last = 40});
     EXPECT_EQ(Query("select sum(n), max(v) from t"), "610,X;") << "more than placeholders";
 }
 
@@ -179,14 +170,11 @@ TEST_P(Contract, ChangesReturnTheirRowsByExecution) {
     ASSERT_EQ(update->Columns().size(), 2u);
     Rows rows{{Integer(1)}, {Integer(3)}, {Integer(0)}};
     Written written;
-    engine::ArrayOutcome outcome;
-    ASSERT_TRUE(update->ExecuteArray(rows, {.first = 0, .last = 3, .returned = &written}, outcome).Ok());
+    const auto outcome = Executed(*update, rows, {.first = 0, .last = 3, .returned = &written});
     EXPECT_EQ(written.text, "11,1;1:12,2;1:13,3;");
     EXPECT_EQ(outcome.affected, 3u);
     EXPECT_EQ(outcome.executed, 3u);
-
-    engine::ArrayOutcome unseen;
-    ASSERT_TRUE(update->ExecuteArray(rows, {}, unseen).Ok()) << "nobody takes the rows";
+    Executed(*update, rows);    // whose rows nobody takes
 }
 
 TEST_P(Contract, ExecutionWhoseRowsAreRefusedIsUndone) {
@@ -197,9 +185,7 @@ TEST_P(Contract, ExecutionWhoseRowsAreRefusedIsUndone) {
     for (const bool all_rows : {false, true}) {
         Written written;
         written.refused = 3;    // the second row of the second execution
-        engine::ArrayOutcome outcome;
-        const engine::ArrayRun run{.first = 0, .last = 3, .all_rows = all_rows, .returned = &written};
-        ASSERT_TRUE(update->ExecuteArray(rows, run, outcome).Ok());
+        const auto outcome = Executed(*update, rows, {0, 3, all_rows, &written});
         EXPECT_EQ(Failures(outcome), "1:1405 ");
         EXPECT_EQ(outcome.affected, all_rows ? 2u : 1u);
         EXPECT_EQ(All(), all_rows ? "2;3;21;" : "2;3;11;");
@@ -221,13 +207,8 @@ TEST_P(Contract, LongArraysReturnTheirRowsAndFailTheirOwn) {
             }
             Written written;
             written.refused = 100;    // of row 100, since row 70 has none
-            engine::ArrayOutcome outcome;
-            const engine::ArrayRun run{.first = 0, .last = 150, .all_rows = all_rows, .returned = &written};
-            ASSERT_TRUE(insert->ExecuteArray(rows, run, outcome).Ok());
-            ASSERT_EQ(outcome.failures.size(), all_rows ? 2u : 1u);
-            EXPECT_EQ(outcome.failures[0].row, 70u);
-            EXPECT_EQ(outcome.failures[0].status.Number(), 1);
-            EXPECT_EQ(outcome.failures.back().row, all_rows ? 100u : 70u);
+            const auto outcome = Executed(*insert, rows, {0, 150, all_rows, &written});
+            EXPECT_EQ(Failures(outcome), all_rows ? "70:1 100:1405 " : "70:1 ");
             EXPECT_EQ(outcome.affected, all_rows ? 148u : 70u);
             EXPECT_TRUE(written.text.ends_with(all_rows ? "148:148;149:149;" : "68:68;69:69;")) << written.text;
             EXPECT_EQ(Query("select count(*) from u where n < 1000"), all_rows ? "148;" : "70;");
@@ -264,9 +245,7 @@ TEST_P(Contract, WhatAStatementDoesBeginsAndEndsTransactions) {
 
 TEST_P(Contract, LockingQueryBeginsATransaction) {
     MakeNumbers();
-    std::unique_ptr<engine::Query> query;
-    std::uint32_t offset = 0;
-    ASSERT_EQ(Answer(connection_->Compile({"select n from t order by n", Effect::locks, {}}, query, offset)), 0);
+    const auto query = Compiled(*connection_, "select n from t order by n", Effect::locks);
     Rows none;
     ASSERT_EQ(Answer(query->Open(none, {})), 0);
     EXPECT_TRUE(connection_->InTransaction());
@@ -624,10 +603,8 @@ TEST_P(Contract, RequestStopsAnArrayThatTriesAllRows) {
     } rows(*stop_);
     Written written;
     for (const bool returns : {false, true}) {
-        engine::ArrayOutcome outcome;
         const auto insert = Prepared(returns ? "insert into t values(%1) returning n" : "insert into t values(%1)", std::vector{Integer(1)});
-        const engine::ArrayRun run{.first = 0, .last = 9, .all_rows = true, .returned = returns ? &written : nullptr};
-        ASSERT_TRUE(insert->ExecuteArray(rows, run, outcome).Ok());
+        const auto outcome = Executed(*insert, rows, {0, 9, true, returns ? &written : nullptr});
         EXPECT_TRUE(stop_->Take());
         EXPECT_EQ(outcome.executed, 1u);
         EXPECT_EQ(Failures(outcome), "0:1 2:1013 ");
@@ -783,10 +760,8 @@ TEST_P(Contract, ConnectionOutlivesItsDatabase) {
     EXPECT_FALSE(connection_->Broken());
     EXPECT_FALSE(connection_->HasNotices());
     EXPECT_TRUE(connection_->TakeNotices().empty());
-    std::unique_ptr<engine::Query> query;
-    std::uint32_t offset = 0;
+    const auto query = Compiled(*connection_, "select count(*) from t", Effect::reads);
     Rows none;
-    ASSERT_TRUE(connection_->Compile({"select count(*) from t", Effect::reads, {}}, query, offset).Ok());
     ASSERT_TRUE(query->Open(none, {}).Ok());
     EXPECT_EQ(Rest(*query), "3;");
 }
@@ -896,15 +871,11 @@ protected:
         MustCommit("insert into l values(1, 'one'), (2, null), (3, 'three')");
     }
     Kept Fetch(engine::Connection& connection, const char* sql, Effect effect) {
-        std::unique_ptr<engine::Query> query;
-        std::uint32_t offset = 0;
-        const std::string text = effect == Effect::locks ? Locking(sql) : sql;
-        EXPECT_EQ(Answer(connection.Compile({text, effect, {}}, query, offset)), 0) << text;
+        const auto query = Compiled(connection, effect == Effect::locks ? Locking(sql) : sql, effect);
         ::Rows none;
         Taking rows(*connection.Lobs());
         if (effect == Effect::changes) {
-            engine::ArrayOutcome outcome;
-            EXPECT_EQ(Answer(query->ExecuteArray(none, {0, 1, false, &rows}, outcome)), 0);
+            Executed(*query, none, {0, 1, false, &rows});
         } else {
             bool more = true;
             SHOULD(Answer(query->Open(none, {})), Answer(query->Fetch(rows, 100, more)));
@@ -920,6 +891,11 @@ protected:
     static int Write(engine::Lob& lob, std::uint64_t offset, std::string_view text) {
         return Answer(lob.Write(offset, std::as_bytes(std::span(text))));
     }
+    static std::uint64_t LengthOf(engine::Lob& lob) {
+        std::uint64_t length = 4711;
+        EXPECT_EQ(Answer(lob.Length(length)), 0);
+        return length;
+    }
     // All of it, or its error.
     static std::string Read(engine::Lob& lob, std::uint64_t offset = 0) {
         std::string text(100, '#');
@@ -928,10 +904,7 @@ protected:
         return status.Ok() ? text.substr(0, read) : "error " + std::to_string(status.Number());
     }
     std::string Stored() {
-        std::unique_ptr<engine::Query> query = Prepared("select k, c || '' from l where c is not null order by k");
-        ::Rows none;
-        EXPECT_EQ(Answer(query->Open(none, {})), 0);
-        return Rest(*query);
+        return Query("select k, c || '' from l where c is not null order by k");
     }
 };
 
@@ -945,9 +918,7 @@ TEST_P(LobContract, LockedOneIsWrittenAndSeenByTheNextStatement) {
     EXPECT_EQ(Stored(), "1,one;3,THree and four;");
     EXPECT_NE(lob->Version(), version);
     EXPECT_EQ(Answer(lob->Trim(2)), 0);
-    std::uint64_t length = 0;
-    EXPECT_EQ(Answer(lob->Length(length)), 0);
-    EXPECT_EQ(length, 2u);
+    EXPECT_EQ(LengthOf(*lob), 2u);
     ASSERT_EQ(Answer(connection_->Commit()), 0);
     EXPECT_EQ(Stored(), "1,one;3,TH;");
     EXPECT_EQ(Write(*lob, 0, "x"), 22990);
@@ -1036,9 +1007,7 @@ TEST_P(LobContract, RowThatIsGoneHasNoValue) {
 }
 
 TEST_P(LobContract, OpenQueryKeepsItsValuesWhileOthersAreWritten) {
-    std::unique_ptr<engine::Query> query;
-    std::uint32_t offset = 0;
-    ASSERT_EQ(Answer(connection_->Compile({Locking("select c from l order by k"), Effect::locks, {}}, query, offset)), 0);
+    const auto query = Compiled(*connection_, Locking("select c from l order by k"), Effect::locks);
     ::Rows none;
     Taking rows(*connection_->Lobs());
     bool more = true;
@@ -1068,9 +1037,7 @@ TEST_P(LobContract, LongOnesAreReadAndWrittenInPieces) {
     EXPECT_TRUE(lob->IsSame(*Locked("select c from l where k = 7")));
     ASSERT_EQ(Answer(connection_->Commit()), 0);
     const Kept plain = Plain("select c from l where k = 7");
-    std::uint64_t length = 0;
-    EXPECT_EQ(Answer(plain->Length(length)), 0);
-    EXPECT_EQ(length, text.size());
+    EXPECT_EQ(LengthOf(*plain), text.size());
     for (const auto& kept : {lob, plain}) {
         for (const std::size_t at : {std::size_t{0}, std::size_t{65500}, std::size_t{3'999'950}, text.size() - 10})
             EXPECT_EQ(Read(*kept, at), text.substr(at, 100)) << at;

@@ -115,8 +115,7 @@ struct Rows : engine::RowSource {
 // row of that number, from 1, is refused.
 struct Written : engine::RowSink {
     std::string text;
-    std::uint64_t taken = 0;
-    std::uint64_t refused = 0;
+    std::uint64_t taken = 0, refused = 0;
     Status Row(std::uint32_t execution, std::span<const Datum> values) override {
         if (++taken == refused) return Error(1405);
         if (execution > 0) text += std::to_string(execution) + ':';
@@ -196,6 +195,17 @@ protected:
     }
     std::unique_ptr<engine::Query> Prepared(std::string_view sql, std::span<const Datum> values = {}) const {
         return Prepared(*connection_, sql, values);
+    }
+    static std::unique_ptr<engine::Query> Compiled(engine::Connection& on, const std::string& sql, Effect effect) {
+        std::unique_ptr<engine::Query> query;
+        std::uint32_t offset = 0;
+        EXPECT_EQ(Answer(on.Compile({sql, effect, {}}, query, offset)), 0) << sql;
+        return query;
+    }
+    static engine::ArrayOutcome Executed(engine::Query& query, engine::RowSource& rows, engine::ArrayRun run = {}) {
+        engine::ArrayOutcome outcome;
+        EXPECT_EQ(Answer(query.ExecuteArray(rows, run, outcome)), 0);
+        return outcome;
     }
     static int Execute(engine::Query& query, engine::RowSource& rows, const engine::ArrayRun& run = {}) {
         engine::ArrayOutcome outcome;

@@ -406,20 +406,16 @@ TEST_F(Postgres, LongArraysAreOneStatement) {
     for (const auto& c : cases) {
         Rows rows;
         rows.rows.assign(20, c.values);
-        engine::ArrayOutcome outcome;
         const auto insert = Prepared(c.sql, c.values);
-        EXPECT_EQ(Answer(insert->ExecuteArray(rows, {.first = 0, .last = 20}, outcome)), 0) << c.sql;
-        EXPECT_EQ(outcome.affected, 20u) << c.sql;
+        EXPECT_EQ(Executed(*insert, rows, {.first = 0, .last = 20}).affected, 20u) << c.sql;
         EXPECT_EQ(Query("select count(*) from s"), c.statements) << c.sql;
         ASSERT_EQ(Run("deallocate all"), 0);                           // the engine's own, too: they are made anew
         EXPECT_EQ(Execute(*insert, rows, {.first = 0, .last = 20}), 0) << c.sql;
         EXPECT_EQ(Query("select count(*) from t"), "40;") << c.sql;
         ASSERT_EQ(Answer(connection_->Rollback()), 0);
     }
-    engine::ArrayOutcome outcome;
     Rows one;
-    EXPECT_EQ(Answer(Prepared("INSERT INTO T VALUES (1)")->ExecuteArray(one, {}, outcome)), 0);
-    EXPECT_TRUE(outcome.last_row);
+    EXPECT_TRUE(Executed(*Prepared("INSERT INTO T VALUES (1)"), one).last_row);
 }
 
 TEST_F(Postgres, MeaningsOfTheSchema) {

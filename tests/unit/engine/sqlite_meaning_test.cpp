@@ -248,11 +248,7 @@ TEST_F(SqliteMeaning, ValuesAreMadeToFitWhereverTheyAreStored) {
 }
 
 // What a column of the query is described as, before anything is fetched.
-struct Described {
-    std::string name;
-    int type, size, precision, scale, characters;
-    bool counts_characters;
-};
+struct Described { std::string name; int type, size, precision, scale, characters; bool counts_characters; };
 bool operator==(const Described& left, const Described& right) {
     const auto tied = [](const Described& d) {
         return std::tie(d.name, d.type, d.size, d.precision, d.scale, d.characters, d.counts_characters);

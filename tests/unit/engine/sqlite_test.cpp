@@ -71,8 +71,7 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
         {"z", "0.12", "error 1438"}, {"r", "'0:'", "error 1465"}, {"r", "5", "error 932"}, {"d", "''", "null"},
         {"u", "kelp_number('123456789012345678901234567890.5')", "123456789012345678901234567890.5"}};
     for (const auto& c : cases) {
-        const std::string column = c.column;
-        const std::string literal = c.literal;
+        const std::string column = c.column, literal = c.literal;
         const std::string want = std::string(c.outcome) + ';';
         const auto outcome = [&](int error) {
             return error ? "error " + std::to_string(error) + ';' : Query("select " + column + (column == "b" ? " || ''" : "") + " from t");
@@ -130,9 +129,8 @@ TEST_F(Sqlite, RowIdOfAChangeIsOfItsTable) {
         ASSERT_EQ(Run(sql), 0) << sql;
     for (const char* sql : {"insert into T values(76)", "update \"t\" set a = 76 where a = 76",
                             "insert into t values(76) on conflict do update set a = 76", "delete from t where a = 76"}) {
-        engine::ArrayOutcome outcome;
         Rows none;
-        ASSERT_TRUE(Prepared(sql)->ExecuteArray(none, {}, outcome).Ok()) << sql;
+        const auto outcome = Executed(*Prepared(sql), none);
         ASSERT_TRUE(outcome.last_row) << sql;
         EXPECT_EQ(Shown(Row(*outcome.last_row)), "row 0000000000000000004c") << sql;
     }
@@ -258,8 +256,7 @@ TEST_F(Sqlite, RefusedValueNamesItsColumn) {
     ASSERT_EQ(Run("create table t(v varchar2(3))"), 0);
     Rows rows{{Text("long")}};
     for (const char* sql : {"insert into t values(?1)", "insert into t values('lo' || substr(?1, 3))"}) {
-        engine::ArrayOutcome outcome;
-        ASSERT_TRUE(Prepared(sql)->ExecuteArray(rows, {}, outcome).Ok());
+        const auto outcome = Executed(*Prepared(sql), rows);
         ASSERT_EQ(outcome.failures.size(), 1u) << sql;
         EXPECT_EQ(outcome.failures[0].status.Number(), 12899);
         EXPECT_EQ(outcome.failures[0].status.Detail(), "column V, actual 4, maximum 3") << sql;

@@ -23,8 +23,7 @@ struct StrikingMemory {
     std::function<void()> strike;
     const void* victim = nullptr;
     bool striking = false;
-    int struck = 0;
-    int too_early = 0;
+    int struck = 0, too_early = 0;
     int out = 0;
 
     static dvoid* Allocate(dvoid* context, size_t size) {

@@ -71,8 +71,7 @@ protected:
         return auth;
     }
     OCISPool* pool_ = nullptr;
-    std::string name_;
-    std::string tag_;
+    std::string name_, tag_;
     boolean found_ = FALSE;
 };
 

@@ -156,13 +156,9 @@ TEST(NumberArithmetic, UnaryFunctionsAtTheirEdges) {
 }
 
 TEST(NumberArithmetic, PrecisionCountsFromTheFirstDigit) {
-    const struct {
-        const char* value;
-        int digits;
-        const char* result;
-    } cases[] = {{"123.456", 4, "123.5"}, {"9.96", 2, "10"},   {"0.0099999", 2, "0.01"},
-                 {"95", 1, "100"},        {"-1.5", 1, "-2"},   {"12345", 40, "12345"},
-                 {"0", 3, "0"},           {"0.05", 1, "0.05"}, {"5", 2000000000, "5"}};
+    const struct { const char* value; int digits; const char* result; } cases[] = {
+        {"123.456", 4, "123.5"}, {"9.96", 2, "10"}, {"0.0099999", 2, "0.01"}, {"95", 1, "100"}, {"-1.5", 1, "-2"},
+        {"12345", 40, "12345"}, {"0", 3, "0"}, {"0.05", 1, "0.05"}, {"5", 2000000000, "5"}};
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::Prec(Number(c.value), c.digits, &got), 0) << c.value;

@@ -51,11 +51,7 @@ private:
     bool underflow_ = false;
 };
 
-struct Function {
-    const char* name;
-    number::Unary function;
-    int (*reference)(mpfr_ptr, mpfr_srcptr, mpfr_rnd_t);
-};
+struct Function { const char* name; number::Unary function; int (*reference)(mpfr_ptr, mpfr_srcptr, mpfr_rnd_t); };
 constexpr Function kFunctions[] = {{"exp", number::Exp, mpfr_exp},        {"sin", number::Sin, mpfr_sin},
                                    {"cos", number::Cos, mpfr_cos},        {"tan", number::Tan, mpfr_tan},
                                    {"arctan", number::ArcTan, mpfr_atan}, {"hypsin", number::HypSin, mpfr_sinh},

@@ -113,8 +113,7 @@ TEST(CodePages, TheShortWayAgreesWithTheLongOne) {
 
 TEST(CodePages, UnknownPagesAndNullAreasAreRefused) {
     char area[4];
-    std::size_t unused_input = 0;
-    std::size_t unused_output = 0;
+    std::size_t unused_input = 0, unused_output = 0;
     EXPECT_EQ(CodePageConvert(1208, 4711, "ab", 2, &unused_input, area, 4, &unused_output), kCodePageUnknown);
     EXPECT_EQ(unused_input, 2u);
     EXPECT_EQ(unused_output, 4u);
@@ -134,8 +133,7 @@ TEST(CodePages, OfTheProcess) {
     for (const auto& c : cases) {
         setenv("LC_ALL", c.locale, 1);
         if (c.setting) setenv("KELPCI_CODEPAGE", c.setting, 1);
-        std::uint32_t first = 0;
-        std::uint32_t second = 0;
+        std::uint32_t first = 0, second = 0;
         const char* const shown = c.setting ? c.setting : c.locale;
         EXPECT_EQ(GetProcessCodePage(&first, &second), c.result) << shown;
         EXPECT_EQ(first, c.first) << shown;

@@ -84,8 +84,7 @@ protected:
     std::string database = ":memory:", user;
     std::array<ub1, HDA_SIZE> host{};
     Lda_Def lda{};
-    Cda_Def cda{};
-    Cda_Def unknown;
+    Cda_Def cda{}, unknown;
     int number = 0;
     std::array<char, 8> characters{};
 };

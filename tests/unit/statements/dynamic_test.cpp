@@ -10,12 +10,7 @@ using std::string;
 
 // A callback for either direction. It notes what it is asked: iteration, index, piece.
 struct Callback {
-    struct Place {
-        dvoid* buffer = nullptr;
-        ub4 length = 0;
-        ub1 piece = 0;
-        dvoid* indicator = nullptr;
-    };
+    struct Place { dvoid* buffer = nullptr; ub4 length = 0; ub1 piece = 0; dvoid* indicator = nullptr; };
     std::function<sb4(Place&)> act;
     string asked;
     Place place;    // of the last call; its length lives here
