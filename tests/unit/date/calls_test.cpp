@@ -1,6 +1,4 @@
 // The calls on dates and datetime descriptors.
-#include <cstring>
-
 #include "support/call_fixture.h"
 
 namespace {

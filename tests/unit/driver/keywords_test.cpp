@@ -1,9 +1,6 @@
 // Keyword tables against rows written down by hand, and the two ways of decoding a word.
-#include <gtest/gtest.h>
-
 #include <climits>
 #include <sstream>
-#include <string>
 
 #include "core/keywords.h"
 #include "support/printed.h"

@@ -1,8 +1,5 @@
 // The tables of named objects: capacities and messages written down by hand, names, arrays, reserved words.
-#include <gtest/gtest.h>
-
 #include <cstring>
-#include <string>
 
 #include "objects/areas.h"
 #include "objects/buffers.h"

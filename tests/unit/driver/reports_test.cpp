@@ -1,8 +1,5 @@
 // Trace lines, diagnostic texts, the command table and lookup, against texts written down by hand.
-#include <gtest/gtest.h>
 #include <unistd.h>
-
-#include <string>
 
 #include "core/command_table.h"
 #include "core/state.h"

@@ -1,8 +1,5 @@
 // Texts between the application code page and UTF-16: what is converted, what is said, what a command passes on.
-#include <gtest/gtest.h>
-
 #include <cstring>
-#include <string>
 
 #include "core/state.h"
 #include "objects/text_conversion.h"

@@ -1,8 +1,5 @@
 // The words that a line gives, and what quotes do beyond the line's own end.
-#include <gtest/gtest.h>
-
 #include <cstring>
-#include <string>
 #include <vector>
 
 #include "loop/tokenizer.h"

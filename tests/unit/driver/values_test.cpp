@@ -1,9 +1,6 @@
 // Elements as they are stored from a script's texts and as they are shown, for the types that need no library.
-#include <gtest/gtest.h>
-
 #include <cstring>
 #include <sstream>
-#include <string>
 
 #include "core/keywords.h"
 #include "core/state.h"

@@ -1,6 +1,5 @@
 // The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good
 // arguments, with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
-#include <fstream>
 #include <functional>
 #include <vector>
 

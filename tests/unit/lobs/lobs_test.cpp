@@ -1,7 +1,5 @@
 // Large objects as an application uses them: locators of columns and temporary ones, characters, pieces, what is refused.
 #include <algorithm>
-#include <string>
-#include <vector>
 
 #include "support/statement_fixture.h"
 

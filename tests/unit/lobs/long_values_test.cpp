@@ -2,7 +2,6 @@
 // byte comes back; and no way but those that need it holds the value in memory.
 #include <filesystem>
 #include <fstream>
-#include <string>
 
 #include "support/statement_fixture.h"
 

@@ -1,7 +1,5 @@
 // Bind, define and parameter handles: which place they serve, what becomes of them when they or their statement are
 // freed, and what their attributes take.
-#include <array>
-
 #include "support/statement_fixture.h"
 
 namespace {

@@ -1,5 +1,4 @@
 // Branches of OCITransStart between threads and sessions; what a transcript cannot show.
-#include <cstring>
 #include <thread>
 
 #include "support/call_fixture.h"
