@@ -113,7 +113,6 @@ Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
     const sql::Step& step = Scanned().steps[index];
     switch (step.run) {
         case sql::Run::nothing: return {};
-        case sql::Run::begin: return Engine().Begin(engine::TransactionMode::read_write);
         case sql::Run::commit: return UsedLink()->Commit();
         case sql::Run::rollback: return UsedLink()->Rollback();
         default: break;

@@ -13,7 +13,6 @@ void BoundText::Take(std::string&& text, sql::StatementText&& scanned,
     bound_ = std::move(places);
     kept_names_.clear();
     is_set_ = true;
-    ++changes_;
 }
 
 bool BoundText::AnyInPieces() const {

@@ -133,7 +133,7 @@ private:
             return (before == "||" || Begins(before)) && (after == "||" || Ends(after)) && AsText(span);
         if (IsComparison(before)) return Ends(after) && BehindComparison(span);
         const std::size_t low = IsWord(before, "and") ? operands_.Before(span.first - 1).first : span.first;
-        if (IsWord(Before(low), "between")) return Ends(after) && Fits(Subject(low - 1), span);
+        if (IsWord(Before(low), "between")) return Ends(after) && Fits(Subject(low - 1), span) && BoundsFit(low, span);
         if (!Begins(before) || IsOneOf(before, {"case", "when", "then", "else", "like", "glob", "limit", "offset"})) return false;
         if (IsWord(before, "in")) return Ends(after) && Fits(Subject(span.first - 1), span);
         if (IsWord(before, "exists")) return true;
@@ -170,13 +170,19 @@ private:
         if (IsWord(At(at), "not")) ++at;
         if (IsWord(At(at), "null")) return true;
         if (is) return false;
-        if (IsWord(At(at), "between")) {
-            const Span first = operands_.From(at + 1);
-            return Fits(first, span) && IsWord(At(first.last), "and") && Fits(operands_.From(first.last + 1), span);
-        }
+        if (IsWord(At(at), "between")) return BoundsFit(at + 1, span);
         if (!IsWord(At(at), "in") || At(at + 1) != "(") return false;
         const Span list{at + 1, operands_.Partner(at + 1) + 1};
         if (operands_.IsQuery({at + 2, list.last})) return Fits(list, span);
+        return ListFits(list, span);
+    }
+
+    // Both bounds behind BETWEEN, all elements behind IN: a value that is read as an interval is compared with each.
+    bool BoundsFit(std::size_t low, Span span) {
+        const Span first = operands_.From(low);
+        return Fits(first, span) && IsWord(At(first.last), "and") && Fits(operands_.From(first.last + 1), span);
+    }
+    bool ListFits(Span list, Span span) {
         const std::vector<Span> parts = operands_.List(list);
         return std::all_of(parts.begin(), parts.end(), [&](Span part) { return Fits(part, span); });
     }
@@ -203,7 +209,8 @@ private:
         const std::string_view word = Before(open);
         const bool is_first = span.first == open + 1;
         if (IsOneOf(word, {"using", "conflict", "set"})) return true;
-        if (IsWord(word, "in")) return Fits(Subject(open - 1), span);
+        if (IsWord(word, "in"))
+            return Fits(Subject(open - 1), span) && ListFits({open, operands_.Partner(open) + 1}, span);
         if (IsWord(word, "values") || (word == "," && IsWord(At(Clause(open)), "values"))) return AsText(span);
         if (!IsPlainName(word)) return false;
         if (is_first && TakesText(word)) return AsText(span);

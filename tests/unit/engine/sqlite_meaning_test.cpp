@@ -307,7 +307,7 @@ TEST_F(SqliteDescribes, NumbersBeforeTheyAreKnownAndOverNoRows) {
 }
 
 TEST_F(SqliteDescribes, RowIdsByAnotherName) {
-    MustRun("create table t(a number)");
+    MustRun("create table t(a integer primary key)");
     const struct { const char* item; const char* name; int type; } cases[] = {
         {"rowid", "ROWID", SQLT_RDD}, {"t.rowid", "ROWID", SQLT_RDD}, {"rowid as r", "R", SQLT_RDD},
         {"rowid r", "R", SQLT_RDD}, {"t.rowid \"Row\"", "Row", SQLT_RDD}};
