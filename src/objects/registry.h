@@ -41,9 +41,6 @@ struct NamedPool : NamedObject {
 struct NamedStatement : NamedObject {
     uint32_t utf16_mode = 0;  // 0x4000 when the statement's character data is UTF-16
 };
-struct NamedBind : NamedObject {  // a define, too
-    void* statement = nullptr;
-};
 struct NamedDescriptor : NamedObject {
     uint32_t array_count = 0;  // elements of the array, 0 for a single descriptor
 };
@@ -60,8 +57,6 @@ template <Kind kKind> struct RecordOfKind { using Type = NamedObject; };
 template <> struct RecordOfKind<Kind::spool> { using Type = NamedPool; };
 template <> struct RecordOfKind<Kind::cpool> { using Type = NamedPool; };
 template <> struct RecordOfKind<Kind::stmt> { using Type = NamedStatement; };
-template <> struct RecordOfKind<Kind::bind> { using Type = NamedBind; };
-template <> struct RecordOfKind<Kind::define> { using Type = NamedBind; };
 template <> struct RecordOfKind<Kind::lob> { using Type = NamedLob; };
 template <> struct RecordOfKind<Kind::result> { using Type = NamedDescriptor; };
 template <> struct RecordOfKind<Kind::rowid> { using Type = NamedDescriptor; };

@@ -13,9 +13,8 @@
 namespace {
 
 // Enters a bind or define under the statement that words[1] names. A name that is taken is entered anew.
-template <Kind kKind, class T> void EnterOnStatement(const NewObject<T>& object, OCIStmt* statement, char** words) {
-    auto* const slot = AsRecord<kKind>(object.EnterAnew(kKind, ParentOf(Kind::stmt, words[1])));
-    if (slot != nullptr) slot->statement = statement;
+template <class T> void EnterOnStatement(Kind kind, const NewObject<T>& object, char** words) {
+    object.EnterAnew(kind, ParentOf(Kind::stmt, words[1]));
 }
 
 // --- Binds -----------------------------------------------------------------------------------------------------------
@@ -109,7 +108,7 @@ void RunBind(const Bind& row, int count, char** words) {
     const sword rc = row.call(object.Place(), placeholder, bind);
     TraceAndReport(row.code, words[1], bind.error, rc);
     if (rc == OCI_SUCCESS && object.Place() != nullptr)
-        EnterOnStatement<Kind::bind>(object, bind.statement, words);
+        EnterOnStatement(Kind::bind, object, words);
 }
 
 constexpr Bind kBinds[] = {
@@ -145,7 +144,7 @@ void DefineByPosition(const CommandRow& row, int, char** words) {
                           target.return_code, mode);
     TraceAndReport(row.code, words[1], error, rc);
     if (rc != OCI_SUCCESS || held != nullptr || object.Place() == nullptr) return;
-    EnterOnStatement<Kind::define>(object, statement, words);
+    EnterOnStatement(Kind::define, object, words);
 }
 
 constexpr PlainCommand kDefines[] = {
