@@ -98,24 +98,44 @@ private:
         const Span subject = Subject(at);
         const Span first = operands_.From(at + 1);
         if (first.Size() == 0 || !IsWord(At(first.last), "and")) return;
-        Compare(subject, first);
-        Compare(subject, operands_.From(first.last + 1));
+        CompareEach(subject, {first, operands_.From(first.last + 1)});
     }
 
-    void In(std::size_t at) {
-        for (const Span& element : operands_.List({at + 1, operands_.Partner(at + 1) + 1}))
-            Compare(Subject(at), element);
+    void In(std::size_t at) { CompareEach(Subject(at), operands_.List({at + 1, operands_.Partner(at + 1) + 1})); }
+
+    void CompareEach(Span subject, const std::vector<Span>& others) {
+        for (const Span other : others) Compare(subject, other);
+        const Span bare = operands_.Bare(subject);
+        if (operands_.IsValue(bare)) CheckTypes(others, IsLiteral(At(bare.first)) && PlainText(At(bare.first)).ends_with(' '));
+    }
+
+    // A value is read in one way only: it cannot be compared with a date or a raw, or with blanks at its end with fixed
+    // text, and with something else, too.
+    void CheckTypes(const std::vector<Span>& others, bool ends_in_blank) {
+        const auto type = [&](const TableColumn& found) -> int {
+            if (IsDateType(found.column.type)) return SQLT_DAT;
+            return found.column.type == SQLT_BIN || (ends_in_blank && found.column.type == SQLT_AFC) ? found.column.type : 0;
+        };
+        const TableColumn* first = nullptr;
+        for (const Span other : others) {
+            const TableColumn* const found = names_.TypeOf(other);
+            if (!found) continue;
+            if (first && type(*first) != type(*found)) status_ = Error(errors::kInconsistentTypes, "column " + found->column.name);
+            first = found;
+        }
     }
 
     // case d when '01-JAN-24' then ... end
     void Case(std::size_t at) {
         const Span subject = operands_.From(at + 1);
+        std::vector<Span> others;
         int depth = 1;
-        for (at = subject.last; at < pieces_.size() && subject.Size() > 0; ++at) {
+        for (at = subject.last; at < pieces_.size() && subject.Size() > 0 && depth > 0; ++at) {
             if (IsWord(At(at), "case")) ++depth;
-            else if (IsWord(At(at), "end") && --depth == 0) return;
-            else if (IsWord(At(at), "when") && depth == 1) Compare(subject, operands_.From(at + 1));
+            else if (IsWord(At(at), "end")) --depth;
+            else if (IsWord(At(at), "when") && depth == 1) others.push_back(operands_.From(at + 1));
         }
+        if (depth == 0) CompareEach(subject, others);
     }
 
     // The column that an expression is, or one of the type of the date that it answers; null for anything else, and

@@ -174,13 +174,17 @@ TEST_F(SqliteMeaning, WhatCannotBeComparedRightlyIsRefused) {
         {"insert into u(id) select id from t where d = '01-JAN-24' = c", 933},
         {"select id from t natural join u where d = '03-FEB-24'", 932},
         {"select id from u natural join t where d = '03-FEB-24'", 932},
+        {"select id from t where '03-FEB-24' in (1, n, d, v)", 932}, {"select id from t where '01-DEC-99' not between v and trunc(d)", 932},
+        {"select case '0A' when r then 1 when v then 2 end from t", 932}, {"select id from t where '03-FEB-24' in (d, r)", 932},
+        {"select id from t where 'x ' in (v, c)", 932},
         {"create view y as select id from t where d > 'today'", 1858}};
     for (const auto& c : cases) EXPECT_EQ(Run(c.sql), c.number) << c.sql;
     for (const char* right : {"select id from t where id = 1 and (n = 5) or n = 6",
                               "select case when id = 1 then 1 else 2 end from t where id = 1",
                               "select id from t where id = case id when 1 then 1 end order by id",
                               "select t.id from t join u on t.id = u.id where t.id = 1", "select id from t where id = 1 order by n = 5, n = 6",
-                              "select id from t where id = 1 group by id having count(*) = 1"})
+                              "select id from t where id = 1 group by id having count(*) = 1",
+                              "select t.id from t, u where t.id = 1 and '03-FEB-24' in (t.d, u.e, null, '1') and 'x' not in (t.v, t.c)"})
         EXPECT_EQ(Rows(right), "1;") << right;
 }
 
