@@ -295,6 +295,7 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     dvoid *root = nullptr, *again = nullptr, *columns = nullptr;
     EXPECT_EQ(Member(describe, &root, 0, OCI_HTYPE_DESCRIBE), 24334);
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
+    EXPECT_EQ(Member(describe, nullptr, 1, OCI_HTYPE_DESCRIBE), 21560);
     const std::int64_t blocks = [&] {
         for (ub4 position = 1; position <= 3; ++position) again = Below(root, OCI_ATTR_LIST_COLUMNS, position);
         return OCI_memGetMemCount();
@@ -307,10 +308,10 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     EXPECT_EQ(OCIDescriptorFree(root, OCI_DTYPE_PARAM), OCI_SUCCESS);
     EXPECT_EQ(Name(again, OCI_ATTR_NAME), "C") << "its object's parameter is gone, its handle lives";
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
+    EXPECT_EQ(Member(describe, nullptr, 1, OCI_HTYPE_DESCRIBE), 21560);
     columns = Attribute<dvoid*>(root, OCI_DTYPE_PARAM, OCI_ATTR_LIST_COLUMNS);
     for (const ub4 position : {0u, 4u, kHuge}) EXPECT_EQ(Member(columns, &again, position), 24334) << position;
     EXPECT_EQ(Member(columns, nullptr, 1), 21560);
-    EXPECT_EQ(Member(describe, nullptr, 1, OCI_HTYPE_DESCRIBE), 21560);
     EXPECT_EQ(Member(root, &again, 1), 24334) << "no list";
     EXPECT_EQ(Member(root, &again, 1, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
     EXPECT_EQ(Member(describe, &again, 1, OCI_HTYPE_SERVER), 24316);

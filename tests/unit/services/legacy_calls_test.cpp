@@ -130,7 +130,7 @@ TEST_F(LegacyCalls, TextsAreParsedAtOnceOrLater) {
     EXPECT_EQ(std::make_tuple(cda.peo, cda.v2_rc), std::make_tuple(10, -904));
     EXPECT_EQ(oexec(&cda), 1003);
     EXPECT_EQ(Parse("select x from t"), 0);
-    EXPECT_EQ(cda.ft, 4);
+    EXPECT_EQ(std::make_tuple(cda.ft, cda.peo), std::make_tuple(4, 0)) << "of this text";
     EXPECT_EQ(oexec(&cda), 904);
     EXPECT_EQ(cda.fc, 4);
     EXPECT_EQ(Parse("drop table t", 0), 0);    // runs, and the execute does not again
@@ -303,7 +303,9 @@ TEST_F(LegacyCalls, PartsOfLongValues) {
     EXPECT_EQ(oexec(&cda), 0);
     EXPECT_EQ(ofen(&cda, 2), 0);    // of several the last
     EXPECT_EQ(read(3, 0), 1405);
-    EXPECT_EQ(ocan(&cda), 0);
+    EXPECT_EQ(oexec(&cda), 0);
+    EXPECT_EQ(read(3, 0), 1002) << "of the former result";
+    SHOULD(ofetch(&cda), ocan(&cda));
     EXPECT_EQ(read(3, 0), 1002);
 }
 
@@ -376,6 +378,7 @@ TEST_F(LegacyCalls, LocksAreWaitedForOrNot) {
     hold();
     EXPECT_EQ(oexec(&cda), 54);
     ASSERT_EQ(oopt(&cda, 2, 0), 0);
+    EXPECT_EQ(cda.fc, 34);
     std::thread releasing([&] {
         std::this_thread::sleep_for(200ms);
         EXPECT_EQ(ocom(&second), 0);

@@ -155,6 +155,18 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 178);
     EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_NCHARSET_ID), 171);
     EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select '\x81' from dual"), 20, OCI_NTV_SYNTAX, 0)), 24501);
+    OCIStmt* tagged = nullptr;
+    OCIBind* bind = nullptr;
+    const auto prepare = [&](const char* sql, const char* tag) {
+        return Answer(OCIStmtPrepare2(svc, &tagged, err_, Text(sql), Length(sql), Text(tag), Length(tag), OCI_NTV_SYNTAX, 0));
+    };
+    EXPECT_EQ(prepare("select '\x81' from dual", "a"), 24501);
+    EXPECT_EQ(prepare("select 1 from dual", "\x81"), 24501);
+    EXPECT_EQ(prepare("select 1 from dual", "a"), 0);
+    EXPECT_EQ(Answer(OCIBindByName(tagged, &bind, err_, Text(":\x81"), 2, area, 8, SQLT_AFC, nullptr, nullptr, nullptr,
+                                   0, nullptr, 0)), 24501);
+    EXPECT_EQ(Answer(OCIStmtRelease(tagged, err_, Text("\x81"), 1, OCI_DEFAULT)), 24501);
+    EXPECT_EQ(Answer(OCIStmtRelease(tagged, err_, nullptr, 0, OCI_DEFAULT)), 0);
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
 }
 

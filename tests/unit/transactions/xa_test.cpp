@@ -164,6 +164,7 @@ TEST_F(XaCalls, InfoStrings) {
         EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 3, TMNOFLAGS), XA_OK);
     }
     EXPECT_EQ(Open(3, "DB=" + std::string(MAXINFOSIZE - 3, 'x')), XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_open_entry(nullptr, 3, TMNOFLAGS), XAER_INVAL);
     // Of several without a name none is the one.
     EXPECT_EQ(Open(3, "SqlNet=three"), XA_OK);
     const struct { const char* name; sb4 length; ub2 answer; } logins[] = {
