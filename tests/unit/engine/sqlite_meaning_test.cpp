@@ -469,6 +469,7 @@ TEST_F(SqliteMeaning, FunctionsAtTheirEdges) {
         {"initcap('1st 2ND o''neil')", "1st 2nd O'Neil"},
         {"instr('abc', 'a', -3)", "1"}, {"instr('abc', 'a', -4)", "0"}, {"instr('abc', 'c', 3)", "3"},
         {"nvl2(1, 'there', 'null')", "there"}, {"nvl2(null, 'there', 'null')", "null"},
+        {"cast('äb' as char(1 char)) || cast('ab' as char)", "äa"}, {"add_months('2024-02-30', 1)", "!1839"}, {"last_day('x')", "!1858"},
         {"instr('abc', 'c', 4)", "0"}, {"'[' || decode(cast('   ' as char(3)), '   ', 'same') || ']'", "[same]"},
     };
     for (const auto& c : cases) EXPECT_EQ(One(std::string("select ") + c.expression + " from dual"), c.value) << c.expression;
