@@ -305,32 +305,32 @@ TEST_F(CallsTest, ExplicitPathInEveryWrongOrder) {
 
 TEST_F(CallsTest, PasswordChange) {
     OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, "test", "ann", "one"), 0);
+    ASSERT_EQ(LogOn(&svc, "test", "zoe", "one"), 0);
     const auto change = [&](OCISvcCtx* on, const char* user, const char* from, const char* to, ub4 mode) {
         return Answer(OCIPasswordChange(on, err_, Text(user), Length(user), Text(from), Length(from), Text(to),
                                         static_cast<sb4>(Length(to)), mode));
     };
-    EXPECT_EQ(change(svc, "ann", "two", "three", 0), 28008);
+    EXPECT_EQ(change(svc, "zoe", "two", "three", 0), 28008);
     EXPECT_EQ(change(svc, "bob", "one", "three", 0), 1017);
-    EXPECT_EQ(change(svc, "ann", "one", nullptr, 0), 988);
-    EXPECT_EQ(change(svc, "ann", "one", "two", 2), 0);
+    EXPECT_EQ(change(svc, "zoe", "one", nullptr, 0), 988);
+    EXPECT_EQ(change(svc, "zoe", "one", "two", 2), 0);
     EXPECT_EQ(change(svc, nullptr, "two", "three", 0), 0) << "who is logged on";
     OCISvcCtx* other = nullptr;
-    EXPECT_EQ(LogOn(&other, "test", "ann", "one"), 1017);
+    EXPECT_EQ(LogOn(&other, "test", "zoe", "one"), 1017);
 
     auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
     other = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 3114);
+    EXPECT_EQ(change(other, "zoe", "three", "four", OCI_AUTH), 3114);
     ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), 4, 0)), 0);
     ASSERT_EQ(Answer(OCIAttrSet(other, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
-    EXPECT_EQ(change(other, "ann", "three", "four", 0), 1012);
-    EXPECT_EQ(change(other, "ann", "wrong", "four", OCI_AUTH), 1017);
+    EXPECT_EQ(change(other, "zoe", "three", "four", 0), 1012);
+    EXPECT_EQ(change(other, "zoe", "wrong", "four", OCI_AUTH), 1017);
     EXPECT_EQ(change(other, nullptr, "three", "four", OCI_AUTH), 1017);
-    EXPECT_EQ(change(other, "ann", "three", std::string(1000, 'x').c_str(), OCI_AUTH), 1017);
+    EXPECT_EQ(change(other, "zoe", "three", std::string(1000, 'x').c_str(), OCI_AUTH), 1017);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012) << "nor is the session left";
-    EXPECT_EQ(change(other, "ann", "three", "four", OCI_AUTH), 0);
+    EXPECT_EQ(change(other, "zoe", "three", "four", OCI_AUTH), 0);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 0) << "the change has begun a session";
-    SHOULD(change(other, "ann", "four", "five", 0), Answer(OCILogoff(other, err_)));
+    SHOULD(change(other, "ZOE", "four", "five", 0), Answer(OCILogoff(other, err_)));
 }
 
 TEST_F(CallsTest, VersionsAreCutToTheBuffer) {

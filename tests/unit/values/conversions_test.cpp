@@ -168,13 +168,15 @@ TEST_F(Conversions, OtherNumbers) {
 
 TEST_F(Conversions, BinaryColumnsKeepTheirReals) {
     MustRun("create table r(f binary_float, d binary_double, n number, k number)",
-            "insert into r values(0.1, 0.1 + 0.2, 0.1 + 0.2, 1), (16777217, 123456789012345678901, '1.5', 2)");
+            "insert into r values(0.1, 0.1 + 0.2, 0.1 + 0.2, 1), (16777217, 123456789012345678901, '1.5', 2), "
+            "(-2.5, 12.345678901, 0, 3)");
     const struct { const char* column; const char* first; const char* last; } columns[] = {
         {"f", ".1", "16777216"}, {"d", OnServer() ? ".3" : ".30000000000000004", "123456789012345680000"}, {"n", ".3", "1.5"}};
     for (const auto& c : columns) {
         EXPECT_EQ(One(std::string("select ") + c.column + " from r where k = 1"), c.first) << c.column;
         EXPECT_EQ(One(std::string("select ") + c.column + " from r where k = 2"), c.last) << c.column;
     }
+    EXPECT_EQ(One("select d from r where k = 3"), "12.345678901");
     EXPECT_EQ(Run("insert into r(f) values(1e39)"), 1426);
     EXPECT_EQ(Run("insert into r(d) values('one')"), 1722);
 }
