@@ -398,7 +398,7 @@ TEST_F(Conversions, IntervalsInExpressions) {
             "create table others(ym interval year(4) to month, v varchar2(40))", "create view seen as select ym as m from spans",
             "insert into spans values(interval '1-2' year to month, cast('2' as interval day to second), '1-2', 14, date '2024-02-09')");
     MustRun("insert into spans(ym, ds) values(interval '-0-3' year to month, interval '1 2:3:4.5' day(1) to second(1))",
-            "insert into main.others(ym, v) select ym, ym from spans", "update others set ym = (select max(s.ym) from spans s), v = ym where ym > '0-0'");
+            "insert into main.others(ym, v) select ym, ym from spans", "update or replace others set ym = (select max(s.ym) from spans s), v = ym where ym > '0-0'");
     const struct { const char *sql, *answer; } cases[] = {
         {"select cast('1-2' as interval year(3) to month) from dual", "+001-02"},
         {"select cast('1 2:3:4.56' as interval day to second(1)) from dual", "+01 02:03:04.6"},
