@@ -23,8 +23,8 @@ bool EndsCondition(std::string_view piece) { return piece == "," || piece == ";"
 
 class Finder {
 public:
-    Finder(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces, ValueTargets& targets)
-        : sql_(sql), pieces_(pieces), operands_(pieces), names_(database, pieces, operands_), targets_(targets) {}
+    Finder(StatementReading& reading, ValueTargets& targets)
+        : sql_(reading.sql), pieces_(reading.pieces), operands_(reading.operands), names_(reading.names), targets_(targets) {}
 
     Status Find() {
         // By depth of parentheses: whether the names of a SET come, whether there has been a comparison.
@@ -184,8 +184,8 @@ private:
 
     std::string_view sql_;
     const std::vector<std::string_view>& pieces_;
-    Operands operands_;
-    Names names_;
+    const Operands& operands_;
+    Names& names_;
     ValueTargets& targets_;
     std::set<std::pair<std::size_t, std::size_t>> added_;    // pieces that have their edit
     Status status_;
@@ -193,9 +193,8 @@ private:
 
 }  // namespace
 
-Status FindComparisons(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                       ValueTargets& targets) {
-    return Finder(database, sql, pieces, targets).Find();
+Status FindComparisons(StatementReading& reading, ValueTargets& targets) {
+    return Finder(reading, targets).Find();
 }
 
 }  // namespace engine::sqlite

@@ -3,20 +3,16 @@
 // better.
 #pragma once
 
-#include <sqlite3.h>
-
-#include <string_view>
-#include <vector>
-
 #include "engine/sqlite/value_targets.h"
 #include "handles/status.h"
 
 namespace engine::sqlite {
 
+struct StatementReading;
+
 // Adds the comparisons of queries and changes, wherever they stand, whose one side is a column, or a call that answers a
 // date. Refuses what SQLite would answer as something else: 933 for a comparison of a comparison, 932 where a date's
 // column cannot be told from another of its name.
-Status FindComparisons(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                       ValueTargets& targets);
+Status FindComparisons(StatementReading& reading, ValueTargets& targets);
 
 }  // namespace engine::sqlite

@@ -33,8 +33,8 @@ bool TakesText(std::string_view function) {
 
 class Finder {
 public:
-    Finder(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces, ValueTargets& targets)
-        : sql_(sql), pieces_(pieces), operands_(pieces), names_(database, pieces, operands_), targets_(targets) {}
+    Finder(StatementReading& reading, ValueTargets& targets)
+        : sql_(reading.sql), pieces_(reading.pieces), operands_(reading.operands), names_(reading.names), targets_(targets) {}
 
     Status Find() {
         for (std::size_t at = operands_.FirstExpression(); at < pieces_.size() && status_.Ok(); ++at) {
@@ -324,8 +324,8 @@ private:
 
     std::string_view sql_;
     const std::vector<std::string_view>& pieces_;
-    Operands operands_;
-    Names names_;
+    const Operands& operands_;
+    Names& names_;
     ValueTargets& targets_;
     const TableColumn* type_ = nullptr;    // of the use that is looked at
     Status status_;
@@ -333,9 +333,8 @@ private:
 
 }  // namespace
 
-Status FindIntervalUses(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                        ValueTargets& targets) {
-    return Finder(database, sql, pieces, targets).Find();
+Status FindIntervalUses(StatementReading& reading, ValueTargets& targets) {
+    return Finder(reading, targets).Find();
 }
 
 }  // namespace engine::sqlite

@@ -92,4 +92,15 @@ private:
     std::deque<TableColumn> columns_;     // that were told of, and what calls answer
 };
 
+// A statement's text with what is read of it once, for all that look for places in it.
+struct StatementReading {
+    StatementReading(sqlite3* database, std::string_view text, const std::vector<std::string_view>& split)
+        : sql(text), pieces(split), operands(split), names(database, split, operands) {}
+
+    std::string_view sql;
+    const std::vector<std::string_view>& pieces;
+    Operands operands;
+    Names names;
+};
+
 }  // namespace engine::sqlite

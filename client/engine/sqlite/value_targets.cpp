@@ -9,6 +9,7 @@
 #include "engine/sqlite/assignments.h"
 #include "engine/sqlite/comparisons.h"
 #include "engine/sqlite/interval_uses.h"
+#include "engine/sqlite/names.h"
 #include "engine/sqlite/stored_number.h"
 #include "engine/sqlite/table_columns.h"
 #include "number/number.h"
@@ -103,9 +104,10 @@ Status Convert(std::string_view text, const Column& column, Coercion::Purpose pu
 Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_intervals, ValueTargets& targets) {
     const std::vector<std::string_view> pieces = Split(sql);
     Status status = FindAssignments(database, sql, pieces, targets);
-    if (status.Ok()) status = FindComparisons(database, sql, pieces, targets);
+    StatementReading reading(database, sql, pieces);
+    if (status.Ok()) status = FindComparisons(reading, targets);
     const bool uses = has_intervals || sql.find(kSpanPrefix) != sql.npos;
-    return status.Ok() && uses ? FindIntervalUses(database, sql, pieces, targets) : status;
+    return status.Ok() && uses ? FindIntervalUses(reading, targets) : status;
 }
 
 }  // namespace engine::sqlite
