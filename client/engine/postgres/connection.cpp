@@ -280,8 +280,10 @@ bool PgConnection::IsObjectType(Oid type) const {
 // The server takes the picture of what a transaction sees with its first question: that is asked at once.
 Status PgConnection::Begin(TransactionMode mode) {
     if (Status status = Enter(); !status.Ok() || in_transaction_) return status;
-    wire_->Send(kBegins[static_cast<std::size_t>(mode)]);
-    if (mode != TransactionMode::read_write) wire_->Send("select 1");
+    const char* const begin = kBegins[static_cast<std::size_t>(mode)];
+    if (mode == TransactionMode::read_write) return Settle(Guard::began, wire_->Run(begin));
+    wire_->Send(begin);
+    wire_->Send("select 1");
     wire_->Sync();
     return Settle(Guard::began, wire_->Drain());
 }

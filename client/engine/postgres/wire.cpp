@@ -266,15 +266,36 @@ Status Wire::Drain(Result* last) noexcept {
             *last = std::move(result);
         }
     }
+    return AfterAll(std::move(first));
+}
+
+// What a batch ends with: that some of it could not be sent, or that the connection was lost, is told where no error was.
+Status Wire::AfterAll(Status first) noexcept {
     if (std::exchange(short_of_memory_, false) && first.Ok()) first = Refused(errors::kOutOfMemory);
     return broken_ && first.Ok() ? Lost() : first;
 }
 
+// Where nothing is on its way the command goes without a pipeline: one message there and one answer, which the server is
+// done with sooner than with the five of a pipeline.
 Status Wire::Run(const char* sql, Result* last) noexcept {
     if (broken_) return Lost();
-    Send(sql);
-    Sync();
-    return Drain(last);
+    if (!Idle() || short_of_memory_ || PQexitPipelineMode(connection_) != 1) {
+        Send(sql);
+        Sync();
+        return Drain(last);
+    }
+    Sent(PQsendQuery(connection_, sql));
+    Status first;
+    for (Result result; (result = Next());) {
+        if (!IsError(result.get())) {
+            if (last) *last = std::move(result);
+        } else if (first.Ok()) {
+            first = Answer(result.get());
+        }
+    }
+    open_ = false;
+    broken_ = broken_ || PQenterPipelineMode(connection_) != 1;
+    return AfterAll(std::move(first));
 }
 
 // A pipeline takes single commands alone.

@@ -1,5 +1,5 @@
-// One libpq connection, always in pipeline mode: commands are sent one behind the other, closed with Sync, and their
-// results read in the same order. It waits for the server, and has it cancel what runs when that is wished for.
+// One libpq connection, in pipeline mode between its calls: commands are sent one behind the other, closed with Sync, and
+// their results read in the same order. It waits for the server, and has it cancel what runs when that is wished for.
 //
 // What was sent must be read to its end before the connection is used for something else: Drain does so, whatever is
 // left. One thread at a time, Wake aside.
@@ -116,6 +116,7 @@ private:
     Status Settle() noexcept;
     bool Wait() noexcept;
     void Sent(int answer) noexcept;
+    Status AfterAll(Status first) noexcept;
     // While one lives, libpq sends what it is given before it goes on, if those are long values.
     class AtOnce {
     public:
