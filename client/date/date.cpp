@@ -2,6 +2,8 @@
 // integer formulas for the Julian and the Gregorian calendar, on years that astronomers count (1 BC is 0).
 #include "date/date.h"
 
+#include <tuple>
+
 #include "handles/errors.h"
 #include "oci_constants.h"
 
@@ -41,13 +43,12 @@ Flags Pair(bool below, bool above, Flags invalid, Flags below_valid) {
 
 // The first of the month, `months` after that of `value`, and whether the year can be had.
 bool MoveMonths(const DateTime& value, std::int64_t months, int* year, int* month) {
-    constexpr std::int64_t kMonths = std::int64_t{12} * (kMaxYear - kMinYear + 1);
-    if (months > kMonths || months < -kMonths) return false;
-    const std::int64_t moved = std::int64_t{12} * (AstronomicalYear(value.year) - kMinYear) + value.month - 1 + months;
-    if (moved < 0) return false;
-    *year = CalendarYear(static_cast<int>(moved / 12) + kMinYear);
+    constexpr int kFirstYear = kMinYear + 1;    // as astronomers count it
+    const std::int64_t moved = 12 * (AstronomicalYear(value.year) - kFirstYear) + value.month - 1 + months;
+    if (moved < 0 || moved / 12 > kMaxYear - kFirstYear) return false;
+    *year = CalendarYear(static_cast<int>(moved / 12) + kFirstYear);
     *month = static_cast<int>(moved % 12) + 1;
-    return *year >= kMinYear && *year <= kMaxYear;
+    return true;
 }
 
 void SetDay(int year, int month, int day, DateTime* value) {
@@ -67,17 +68,14 @@ bool AddSecond(DateTime* value) {
     return true;
 }
 
-template <class T>
-int Order(const T& left, const T& right) { return left < right ? -1 : right < left; }
-
 }  // namespace
 
 Flags CheckDate(const DateTime& value) noexcept {
     Flags flags = Pair(value.year < kMinYear, value.year > kMaxYear, OCI_DATE_INVALID_YEAR, OCI_DATE_YEAR_BELOW_VALID);
     if (value.year == 0) flags |= OCI_DATE_YEAR_ZERO;
-    flags |= Pair(value.month < 1, value.month > 12, OCI_DATE_INVALID_MONTH, OCI_DATE_MONTH_BELOW_VALID);
-    const int last_day = value.month < 1 || value.month > 12 ? 31 : DaysInMonth(value.year, value.month);
-    flags |= Pair(value.day < 1, value.day > last_day, OCI_DATE_INVALID_DAY, OCI_DATE_DAY_BELOW_VALID);
+    const Flags month = Pair(value.month < 1, value.month > 12, OCI_DATE_INVALID_MONTH, OCI_DATE_MONTH_BELOW_VALID);
+    const int last_day = month ? 31 : DaysInMonth(value.year, value.month);
+    flags |= month | Pair(value.day < 1, value.day > last_day, OCI_DATE_INVALID_DAY, OCI_DATE_DAY_BELOW_VALID);
     if (IsMissing(value.year, value.month, value.day)) flags |= OCI_DATE_DAY_MISSING_FROM_1582;
     return flags;
 }
@@ -203,12 +201,10 @@ std::int32_t DaysBetween(const DateTime& left, const DateTime& right) noexcept {
 }
 
 int Compare(const DateTime& left, const DateTime& right) noexcept {
-    const auto seconds = [](const DateTime& value) {
-        return ((((value.year * 16LL + value.month) * 32 + value.day) * 32 + value.hour) * 64 + value.minute) * 64 +
-               value.second;
+    const auto fields = [](const DateTime& value) {
+        return std::tie(value.year, value.month, value.day, value.hour, value.minute, value.second, value.nanosecond);
     };
-    const int order = Order(seconds(left), seconds(right));
-    return order ? order : Order(left.nanosecond, right.nanosecond);
+    return (fields(left) > fields(right)) - (fields(left) < fields(right));
 }
 
 }  // namespace date

@@ -38,7 +38,7 @@ public:
     [[nodiscard]] bool AtEnd() const { return text_.empty(); }
 
     bool Take(char wanted) {
-        if (text_.empty() || text_.front() != wanted) return false;
+        if (!text_.starts_with(wanted)) return false;
         text_.remove_prefix(1);
         return true;
     }

@@ -95,7 +95,7 @@ private:
     void SkipBlanks() { rest_.remove_prefix(std::min(rest_.find_first_not_of(' '), rest_.size())); }
 
     bool TakeChar(char wanted) {
-        if (rest_.empty() || rest_.front() != wanted) return false;
+        if (!rest_.starts_with(wanted)) return false;
         rest_.remove_prefix(1);
         return true;
     }

@@ -79,8 +79,7 @@ public:
     // The digits behind the point; false for more than nine.
     bool Fraction(std::int64_t* nanoseconds) {
         const std::size_t digits = DigitCount();
-        if (digits > kMostDigits || digits == 0) return false;
-        if (!Number(nanoseconds)) return false;
+        if (digits > kMostDigits || !Number(nanoseconds)) return false;
         for (std::size_t place = digits; place < kMostDigits; ++place) *nanoseconds *= 10;
         return true;
     }
@@ -158,8 +157,8 @@ Errno Add(const Interval& left, const Interval& right, Interval* result) noexcep
 
 Errno Compare(const Interval& left, const Interval& right, int* order) noexcept {
     if (left.span != right.span) return errors::kNotComparable;
-    if (left.whole != right.whole) *order = left.whole < right.whole ? -1 : 1;
-    else *order = (left.nanosecond > right.nanosecond) - (left.nanosecond < right.nanosecond);
+    const std::pair one(left.whole, left.nanosecond), other(right.whole, right.nanosecond);
+    *order = (one > other) - (one < other);
     return 0;
 }
 
@@ -189,7 +188,7 @@ Errno ToText(const Interval& value, unsigned leading, unsigned fraction, char* t
     if (shown.whole < 0 || shown.nanosecond < 0) shown = Negative(shown);
     std::int64_t limit = 1;
     for (unsigned digit = 0; digit < leading; ++digit) limit *= 10;
-    if (Leading(shown) >= limit && Leading(shown) > 0) return errors::kLeadingPrecision;
+    if (Leading(shown) >= limit) return errors::kLeadingPrecision;
     at = PutDigits(Leading(shown), std::max(leading, 1U), at);
     if (shown.span == Span::year_month) {
         *at++ = '-';

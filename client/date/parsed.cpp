@@ -26,9 +26,8 @@ constexpr struct { Field field; int lowest, highest; Errno number; } kRanges[] =
 
 // Two digits mean the year next to now: in the half of a century that lies nearer.
 int RoundedYear(int two_digits, int current) {
-    const int century = current - current % 100;
-    if (two_digits < 50) return century + two_digits + (current % 100 < 50 ? 0 : 100);
-    return century + two_digits - (current % 100 < 50 ? 100 : 0);
+    const int nearest = (current + 50) / 100 * 100;    // century
+    return nearest + two_digits - (two_digits < 50 ? 0 : 100);
 }
 
 // Fewer than four digits mean a year that begins as the current one does.
@@ -36,6 +35,13 @@ int CompletedYear(int digits, unsigned width, int current) {
     int modulus = 1;
     for (unsigned i = 0; i < width; ++i) modulus *= 10;
     return current - current % modulus + digits;
+}
+
+// A number as the published Julian day count has it (see docs), as a day; 1864 in the year 0 that it leaves room for.
+Errno FromJulianDay(int julian, DayNumber* day) {
+    constexpr int kYearZero = 1721059, kYearOne = 1721424;
+    *day = julian >= kYearOne ? julian : julian + 365;
+    return julian >= kYearZero && julian < kYearOne ? errors::kNotInCalendar : 0;
 }
 
 }  // namespace
@@ -52,13 +58,6 @@ Field SlotOf(Field field) noexcept {
         case Field::hour12: return Field::hour24;
         default: return field;
     }
-}
-
-Errno FromJulianDay(int julian, DayNumber* day) noexcept {
-    constexpr int kYearZero = 1721059, kYearOne = 1721424;
-    if (julian >= kYearZero && julian < kYearOne) return errors::kNotInCalendar;
-    *day = julian < kYearZero ? julian + 365 : julian;
-    return 0;
 }
 
 Errno Parsed::Claim(const Element& element) noexcept {
@@ -107,7 +106,7 @@ Errno Parsed::ResolveDate(DateTime* result) const noexcept {
         if (const Errno number = Now(&now)) return number;
     }
     result->year = static_cast<std::int16_t>(Has(Field::year) ? Get(Field::year) : now.year);
-    if (Has(Field::era) && Get(Field::era) < 0) result->year = static_cast<std::int16_t>(-result->year);
+    if (BeforeChrist()) result->year = static_cast<std::int16_t>(-result->year);
     result->month = static_cast<std::uint8_t>(Has(Field::month) ? Get(Field::month) : now.month);
     result->day = static_cast<std::uint8_t>(Has(Field::day) ? Get(Field::day) : 1);
     if (Has(Field::julian)) {
@@ -127,7 +126,7 @@ Errno Parsed::ResolveDate(DateTime* result) const noexcept {
 
 // Fields that were given although others already tell the day must agree with them.
 Errno Parsed::CheckAgainst(const DateTime& value) const noexcept {
-    const int year = Has(Field::era) && Get(Field::era) < 0 ? -Get(Field::year) : Get(Field::year);
+    const int year = BeforeChrist() ? -Get(Field::year) : Get(Field::year);
     if (Has(Field::year) && year != value.year) return 1831;
     if (Has(Field::month) && Get(Field::month) != value.month) return 1833;
     if (Has(Field::day) && Get(Field::day) != value.day) return 1834;
@@ -135,7 +134,7 @@ Errno Parsed::CheckAgainst(const DateTime& value) const noexcept {
 }
 
 Errno Parsed::ResolveTime(DateTime* result) const noexcept {
-    const bool afternoon = Has(Field::half_day) && Get(Field::half_day) > 0;
+    const bool afternoon = Get(Field::half_day) > 0;
     int hour = Get(Field::hour24) + (afternoon ? 12 : 0);
     int minute = Get(Field::minute), second = Get(Field::second);
     if (Has(Field::second_of_day)) {

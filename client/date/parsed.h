@@ -26,6 +26,7 @@ public:
 private:
     [[nodiscard]] bool Has(Field slot) const { return given_[static_cast<std::size_t>(slot)]; }
     [[nodiscard]] int Get(Field slot) const { return values_[static_cast<std::size_t>(slot)]; }
+    [[nodiscard]] bool BeforeChrist() const { return Get(Field::era) < 0; }
     void Put(Field slot, int value);
     Errno ResolveDate(DateTime* result) const noexcept;
     Errno ResolveTime(DateTime* result) const noexcept;
@@ -44,8 +45,5 @@ private:
 
 // The slot of a field.
 Field SlotOf(Field field) noexcept;
-
-// A number as the published Julian day count has it (see docs), as a day; 1864 in the year 0 that it leaves room for.
-Errno FromJulianDay(int julian, DayNumber* day) noexcept;
 
 }  // namespace date

@@ -127,11 +127,14 @@ public:
         for (;;) {
             if (const Errno number = model.Next(scope_, &element)) return number;
             if (element.field == Field::end) return error_;
+            if (value_.month == 0 && NeedsDate(element.field)) return errors::kNoSuchField;
             Put(element);
         }
     }
 
 private:
+    static bool NeedsDate(Field field) { return field >= Field::year && field < Field::half_day; }
+
     void Put(const Element& element) {
         if (element.numeric) return PutNumber(element);
         switch (element.field) {
@@ -164,7 +167,7 @@ private:
     // A model that an element stands for; its switches end with it.
     void PutPart(std::string_view model) {
         const bool filled = filled_;
-        (void)Run(model);    // a language's own models are well-formed
+        error_ = Run(model);    // which are well-formed, but a time alone has no date
         filled_ = filled;
     }
 
@@ -262,7 +265,7 @@ private:
     int fraction_digits_;
     Writer& writer_;
     bool filled_ = true;    // leading zeros and trailing blanks
-    Errno error_ = 0;       // a zone that could not be told
+    Errno error_ = 0;       // a zone that could not be told, or a date that is none
 };
 
 }  // namespace

@@ -20,13 +20,12 @@ constexpr struct { std::string_view cardinal, ordinal; } kOrdinals[] = {
 }  // namespace
 
 void Words::Append(std::string_view text) noexcept {
-    if (text.size() > text_.size() - length_) return;
     std::memcpy(text_.data() + length_, text.data(), text.size());
     length_ += text.size();
 }
 
 void Words::Put(std::string_view word) noexcept {
-    if (length_ > 0) Append(" ");
+    if (!View().empty()) Append(" ");
     Append(word);
 }
 

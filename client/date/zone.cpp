@@ -277,9 +277,8 @@ Errno CompareMoments(const DateTime& left, const DateTime& right, int* order) no
             *order = Compare(left, right);
             return 0;
         }
-        const std::int64_t left_seconds = MomentSeconds(left), right_seconds = MomentSeconds(right);
-        *order = left_seconds != right_seconds ? (left_seconds < right_seconds ? -1 : 1)
-                                               : (left.nanosecond > right.nanosecond) - (left.nanosecond < right.nanosecond);
+        const std::pair one(MomentSeconds(left), left.nanosecond), other(MomentSeconds(right), right.nanosecond);
+        *order = (one > other) - (one < other);
         return 0;
     });
 }

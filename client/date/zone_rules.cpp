@@ -40,7 +40,7 @@ public:
 
 private:
     bool Take(char wanted) {
-        if (rest_.empty() || rest_.front() != wanted) return false;
+        if (!rest_.starts_with(wanted)) return false;
         rest_.remove_prefix(1);
         return true;
     }

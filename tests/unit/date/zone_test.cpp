@@ -38,6 +38,7 @@ TEST(Zone, RegionsKnowTheirSeasons) {
         {"2024-10-27 03:00:00", "Europe/Paris", 60, "CET"}, {"2099-07-15 12:00:00", "America/New_York", -240, "EDT"},
         {"2024-01-15 12:00:00", "Australia/Sydney", 660, "AEDT"}, {"2024-01-15 12:00:00", "Asia/Kolkata", 330, "IST"},
         {"1890-01-15 12:00:00", "Europe/Berlin", 53, "LMT"}, {"2024-01-15 12:00:00", "UTC", 0, "UTC"},
+        {"2024-01-15 12:00:00", "Etc/GMT+5", -300, "-05"}, {"2024-01-15 12:00:00", "Etc/GMT-14", 840, "+14"},
     };
     for (const auto& c : cases) {
         DateTime value = Read(c.value);
@@ -145,7 +146,7 @@ TEST(ZoneRules, TextsOfRules) {
         {"XXX3YYY2,59/0,300/0", 1709175599, -10800, "XXX"},   // 59 is 29 February in leap years
         {"XXX3YYY2,59/0,300/0", 1709175600, -7200, "YYY"}, {"XXX3YYY2,M2.5.6/0,M10.5.6/0", 1708743600, -7200, "YYY"},
         {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},  // J60 is 1 March in leap years, too
-        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"},
+        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"}, {"XXX0YYY-1,J365/12,100", 1735639200, 0, "XXX"},
     };
     for (const auto& c : cases) {
         const auto rules = ZoneRules::FromText(c.text);
@@ -158,6 +159,45 @@ TEST(ZoneRules, TextsOfRules) {
                              "CET-1CEST,M0.5.0,M10.5.0", "CET-1CEST,M3.5.7,M10.5.0", "CET-1CEST,366,M10.5.0",
                              "CET-1CEST,J366,M10.5.0", "<CET-1", "CET-999", "UTC0x", "LMT0:60", "LMT0:0:60", "LMT0:0:"}) {
         EXPECT_FALSE(ZoneRules::FromText(text)) << text;
+    }
+}
+
+// Files of one type and one change, each wrong by as little as can be.
+TEST(ZoneRules, SmallFiles) {
+    const struct { std::uint8_t index, letter; std::int32_t offset; bool read; } cases[] = {
+        {0, 0, 3600, true}, {1, 0, 3600, false}, {0, 3, 3600, true}, {0, 4, 3600, false}, {0, 0, 100000, true},
+        {0, 0, 100001, false}, {0, 0, -100000, true}, {0, 0, -100001, false}};
+    for (const auto& c : cases) {
+        std::string bytes = "TZif" + std::string(16, '\0');
+        const auto put = [&](std::int32_t number) {
+            for (int shift = 24; shift >= 0; shift -= 8) bytes += static_cast<char>(number >> shift);
+        };
+        for (const int count : {0, 0, 0, 1, 1, 4}) put(count);
+        put(1000);
+        bytes += static_cast<char>(c.index);
+        put(c.offset);
+        bytes += {'\0', static_cast<char>(c.letter), 'A', 'B', 'C', '\0'};
+        const auto rules = ZoneRules::FromFile(bytes);
+        ASSERT_EQ(rules.has_value(), c.read) << c.offset << ' ' << int{c.letter};
+        if (!rules) continue;
+        EXPECT_EQ(rules->At(1000).offset, c.offset);
+        EXPECT_EQ(rules->At(999).abbreviation, c.letter ? "" : "ABC");
+        EXPECT_FALSE(ZoneRules::FromFile(bytes.substr(0, bytes.size() - 1)));
+    }
+}
+
+// A process reads its zone once, so that each has a process of its own.
+TEST(ZoneDeath, TheProcessHasTheZoneThatTzNames) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    const struct { const char* variable; int minutes; } cases[] = {
+        {"Asia/Kolkata", 330}, {":Asia/Kolkata", 330}, {"/usr/share/zoneinfo/Asia/Tokyo", 540}, {"XXX-3", 180},
+        {":XXX3:30", -210}, {"Atlantis/Nowhere", 0}, {"../zoneinfo/Asia/Tokyo", 0}, {"", 0}};
+    for (const auto& c : cases) {
+        EXPECT_EXIT({
+            setenv("TZ", c.variable, 1);
+            DateTime value = Read("2024-01-01");
+            std::exit(SetZone({}, &value) == 0 && value.zone_minutes == c.minutes ? 0 : 1);
+        }, testing::ExitedWithCode(0), "") << c.variable;
     }
 }
 
