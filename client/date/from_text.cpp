@@ -92,7 +92,7 @@ private:
         }
     }
 
-    void SkipBlanks() { rest_.remove_prefix(std::min(rest_.find_first_not_of(' '), rest_.size())); }
+    void SkipBlanks() { rest_ = WithoutLeadingBlanks(rest_); }
 
     bool TakeChar(char wanted) {
         if (!rest_.starts_with(wanted)) return false;

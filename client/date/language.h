@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "date/format.h"
+#include "date/letters.h"
 
 namespace date {
 
@@ -23,13 +24,6 @@ struct Language {
     std::string_view short_date;    // DS
     std::string_view short_time;    // TS
 };
-
-// The characters, not bytes, of a name.
-constexpr std::size_t CharacterCount(std::string_view text) {
-    std::size_t count = 0;
-    for (const char c : text) count += (static_cast<unsigned char>(c) & 0xC0) != 0x80;
-    return count;
-}
 
 // To how many characters names of a list are filled up.
 template <std::size_t count>

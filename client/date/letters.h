@@ -34,4 +34,16 @@ constexpr bool EqualFolded(std::string_view left, std::string_view right) {
     return left.size() == right.size() && StartsWithFolded(left, right);
 }
 
+constexpr std::string_view WithoutLeadingBlanks(std::string_view text) {
+    const std::size_t first = text.find_first_not_of(' ');
+    return first == std::string_view::npos ? std::string_view() : text.substr(first);
+}
+
+// The characters, not bytes, of a text in UTF-8.
+constexpr std::size_t CharacterCount(std::string_view text) {
+    std::size_t count = 0;
+    for (const char c : text) count += (static_cast<unsigned char>(c) & 0xC0) != 0x80;
+    return count;
+}
+
 }  // namespace date

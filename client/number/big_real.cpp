@@ -99,7 +99,7 @@ void ScaleBy100(const mp_limb_t* whole, mp_size_t size, int power, int precision
 // Takes 39 or 40 digits, which fill the first 20 places; false with the direction to go when they are more or fewer.
 bool TakeWhole(const mp_limb_t* limbs, mp_size_t count, Digits* digits, int* step) {
     mp_limb_t whole[3] = {};
-    for (mp_size_t i = 0; i < count && i < 3; ++i) whole[i] = limbs[i];
+    std::copy_n(limbs, std::min<mp_size_t>(count, 3), whole);
     const std::uint64_t low = mpn_divrem_1(whole, 0, whole, 3, kLimb);
     const std::uint64_t middle = mpn_divrem_1(whole, 0, whole, 3, kLimb);
     constexpr std::uint64_t kHalfLimb = 100'000'000;

@@ -1,5 +1,6 @@
 #include "number/format_model.h"
 
+#include "date/letters.h"
 #include "handles/errors.h"
 
 namespace number {
@@ -9,8 +10,6 @@ namespace {
 using Kind = FormatModel::Kind;
 using Sign = FormatModel::Sign;
 using Currency = FormatModel::Currency;
-
-char Upper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; }
 
 // Reads a fixed or scientific model, element by element.
 class FixedParser {
@@ -32,8 +31,7 @@ private:
     [[nodiscard]] int Places() const { return model_.places_before + model_.places_after; }
 
     bool Take(std::string_view word) {
-        for (std::size_t i = 0; i < word.size(); ++i)
-            if (at_ + i >= text_.size() || Upper(text_[at_ + i]) != word[i]) return false;
+        if (!date::StartsWithFolded(text_.substr(at_), word)) return false;
         at_ += word.size();
         return true;
     }
@@ -42,7 +40,7 @@ private:
         if (Take("EEEE")) return Exponent();
         if (Take("MI")) return EndSign(Sign::trailing_minus);
         if (Take("PR")) return EndSign(Sign::brackets);
-        const char element = Upper(text_[at_++]);
+        const char element = date::ToUpper(text_[at_++]);
         switch (element) {
             case '9': return Place(false);
             case '0': return Place(true);
@@ -99,7 +97,7 @@ private:
             model_.currency = Currency::leading;
             return model_.point == 0 || element == '$';
         }
-        const bool more = at_ < text_.size() && IsPlace(text_[at_]);
+        const bool more = text_.substr(at_).find_first_of("09") == 0;
         model_.currency = more ? Currency::point : Currency::trailing;
         return more ? Point(element) : true;
     }
@@ -133,17 +131,10 @@ private:
     bool ended_ = false;
 };
 
-bool Is(std::string_view text, std::string_view word) {
-    if (text.size() != word.size()) return false;
-    for (std::size_t i = 0; i < word.size(); ++i)
-        if (Upper(text[i]) != word[i]) return false;
-    return true;
-}
-
 // Zeros, then X or x.
 bool ParseHexadecimal(std::string_view text, FormatModel* model) {
     const std::size_t zeros = text.find_first_not_of('0');
-    if (zeros == std::string_view::npos || Upper(text[zeros]) != 'X') return false;
+    if (zeros == std::string_view::npos || date::ToUpper(text[zeros]) != 'X') return false;
     if (text.find_first_not_of("xX", zeros) != std::string_view::npos) return false;
     model->kind = Kind::hexadecimal;
     model->lower_case = text[zeros] == 'x';
@@ -156,15 +147,15 @@ bool ParseHexadecimal(std::string_view text, FormatModel* model) {
 
 Errno ParseFormat(std::string_view text, FormatModel* model) noexcept {
     *model = FormatModel{};
-    if (Is(text.substr(0, 2), "FM")) {
+    if (date::StartsWithFolded(text, "FM")) {
         model->fill = false;
         text.remove_prefix(2);
     }
-    if (Is(text, "TM") || Is(text, "TM9")) {
+    if (date::EqualFolded(text, "TM") || date::EqualFolded(text, "TM9")) {
         model->kind = Kind::shortest;
-    } else if (Is(text, "TME")) {
+    } else if (date::EqualFolded(text, "TME")) {
         model->kind = Kind::shortest_scientific;
-    } else if (Is(text, "RN")) {
+    } else if (date::EqualFolded(text, "RN")) {
         model->kind = Kind::roman;
         model->lower_case = text[0] == 'r';
     } else if (!ParseHexadecimal(text, model)) {

@@ -1,6 +1,7 @@
 // Text to numbers by a model.
 #include <algorithm>
 
+#include "date/letters.h"
 #include "handles/errors.h"
 #include "number/decimal.h"
 #include "number/format.h"
@@ -9,8 +10,6 @@
 namespace number {
 
 namespace {
-
-char Upper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; }
 
 // Reads a text from the front; every step says whether it found what the model wants there.
 class Reader {
@@ -45,7 +44,7 @@ private:
         return true;
     }
     bool Take(std::string_view word) {
-        if (word.empty() || !text_.substr(at_).starts_with(word)) return false;
+        if (!text_.substr(at_).starts_with(word)) return false;
         at_ += word.size();
         return true;
     }
@@ -137,18 +136,14 @@ private:
     DigitReader digits_;
 };
 
-std::string_view WithoutLeadingBlanks(std::string_view text) {
-    return text.substr(std::min(text.find_first_not_of(' '), text.size()));
-}
-
 Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber* result) {
-    text = WithoutLeadingBlanks(text);
+    text = date::WithoutLeadingBlanks(text);
     if (text.empty() || text.size() > static_cast<std::size_t>(model.places_before)) return errors::kBadNumberText;
     OCINumber value, sixteen, digit, product;
     SetZero(&value);
     FromInt64(16, &sixteen);
     for (const char c : text) {
-        const char letter = Upper(c);
+        const char letter = date::ToUpper(c);
         const bool is_letter = letter >= 'A' && letter <= 'F';
         if (!IsDigit(c) && !is_letter) return errors::kBadNumberText;
         FromInt64(is_letter ? letter - 'A' + 10 : c - '0', &digit);
@@ -161,10 +156,10 @@ Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber
 
 // Reads what it can digit by digit; the letters must then be those that the value is spelled with.
 Errno ReadRoman(std::string_view text, OCINumber* result) {
-    text = WithoutLeadingBlanks(text);
+    text = date::WithoutLeadingBlanks(text);
     if (text.empty() || text.size() > kRomanWidth) return errors::kBadNumberText;
     char upper[kRomanWidth];
-    std::transform(text.begin(), text.end(), upper, Upper);
+    std::transform(text.begin(), text.end(), upper, date::ToUpper);
     const std::string_view capitals(upper, text.size());
     std::string_view rest = capitals;
     int value = 0;

@@ -1,4 +1,5 @@
 // The NLS text of a conversion: settings, each a name, an equals sign and a value.
+#include "date/letters.h"
 #include "handles/errors.h"
 #include "number/format.h"
 
@@ -20,21 +21,6 @@ constexpr struct {
     {"PORTUGAL", "EUR"}, {"RUSSIA", "RUB"},         {"SPAIN", "EUR"},   {"SWEDEN", "SEK"},  {"SWITZERLAND", "CHF"},
     {"TURKEY", "TRY"},   {"UNITED KINGDOM", "GBP"},
 };
-
-char Upper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; }
-
-bool SameWord(std::string_view a, std::string_view b) {
-    if (a.size() != b.size()) return false;
-    for (std::size_t i = 0; i < a.size(); ++i)
-        if (Upper(a[i]) != b[i]) return false;
-    return true;
-}
-
-std::string_view TakeBlanks(std::string_view text) {
-    std::size_t count = 0;
-    while (count < text.size() && text[count] == ' ') ++count;
-    return text.substr(count);
-}
 
 // Takes a value in doubled or single quotes, or up to the next blank.
 bool TakeValue(std::string_view* text, std::string_view* value) {
@@ -58,15 +44,13 @@ bool SetNumericCharacters(std::string_view value, Nls* nls) {
 }
 
 bool SetText(std::string_view value, std::string_view* setting) {
-    std::size_t characters = 0;
-    for (const char c : value) characters += (static_cast<unsigned char>(c) & 0xC0) != 0x80;
     *setting = value;
-    return characters <= kMostCurrency;
+    return date::CharacterCount(value) <= kMostCurrency;
 }
 
 bool SetTerritory(std::string_view value, Nls* nls) {
     for (const auto& row : kTerritories) {
-        if (!SameWord(value, row.territory)) continue;
+        if (!date::EqualFolded(value, row.territory)) continue;
         nls->iso_currency = row.currency;
         return true;
     }
@@ -74,25 +58,23 @@ bool SetTerritory(std::string_view value, Nls* nls) {
 }
 
 bool Set(std::string_view name, std::string_view value, Nls* nls) {
-    if (SameWord(name, "NLS_NUMERIC_CHARACTERS")) return SetNumericCharacters(value, nls);
-    if (SameWord(name, "NLS_CURRENCY")) return SetText(value, &nls->currency);
-    if (SameWord(name, "NLS_DUAL_CURRENCY")) return SetText(value, &nls->dual_currency);
-    if (SameWord(name, "NLS_ISO_CURRENCY")) return SetTerritory(value, nls);
+    if (date::EqualFolded(name, "NLS_NUMERIC_CHARACTERS")) return SetNumericCharacters(value, nls);
+    if (date::EqualFolded(name, "NLS_CURRENCY")) return SetText(value, &nls->currency);
+    if (date::EqualFolded(name, "NLS_DUAL_CURRENCY")) return SetText(value, &nls->dual_currency);
+    if (date::EqualFolded(name, "NLS_ISO_CURRENCY")) return SetTerritory(value, nls);
     return false;
 }
 
 }  // namespace
 
 Errno ParseNls(std::string_view text, Nls* nls) noexcept {
-    for (text = TakeBlanks(text); !text.empty(); text = TakeBlanks(text)) {
+    for (text = date::WithoutLeadingBlanks(text); !text.empty(); text = date::WithoutLeadingBlanks(text)) {
         std::size_t length = 0;
-        while (length < text.size() &&
-               (Upper(text[length]) == '_' || (Upper(text[length]) >= 'A' && Upper(text[length]) <= 'Z')))
-            ++length;
+        while (length < text.size() && (text[length] == '_' || date::IsLetter(text[length]))) ++length;
         const std::string_view name = text.substr(0, length);
-        text = TakeBlanks(text.substr(length));
+        text = date::WithoutLeadingBlanks(text.substr(length));
         if (!text.starts_with('=')) return errors::kBadNls;
-        text = TakeBlanks(text.substr(1));
+        text = date::WithoutLeadingBlanks(text.substr(1));
         std::string_view value;
         if (!TakeValue(&text, &value) || !Set(name, value, nls)) return errors::kBadNls;
     }

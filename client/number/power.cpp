@@ -13,13 +13,11 @@ BigReal NaturalLogarithm(const OCINumber& value, const Digits& digits, int limbs
     constexpr long kNear = -8;
     OCINumber difference, one;
     Digits difference_digits;
-    const bool may_be_near = digits.exponent == 0 ? DigitAt(digits, 0) == 1 && DigitAt(digits, 1) == 0
-                                                   : digits.exponent == -1 && DigitAt(digits, 0) == 99;
     FromInt64(1, &one);
-    if (may_be_near && Sub(value, one, &difference) == 0 && Unpack(difference, &difference_digits) == 0) {
-        const BigReal real = BigReal::FromDigits(limbs, difference_digits);
-        if (real.IsZero() || real.Exponent() <= kNear) return LogarithmNextToOne(real);
-    }
+    Sub(value, one, &difference);
+    Unpack(difference, &difference_digits);
+    const BigReal real = BigReal::FromDigits(limbs, difference_digits);
+    if (real.IsZero() || real.Exponent() <= kNear) return LogarithmNextToOne(real);
     return Logarithm(BigReal::FromDigits(limbs, digits));
 }
 

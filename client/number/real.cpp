@@ -21,8 +21,8 @@ template <class Real, class... Places> Errno FromReal(Real value, OCINumber* res
     if (std::isinf(value)) return errors::kNumberOverflow;
     char text[kMaxText];
     const auto end = std::to_chars(text, text + sizeof text, value, std::chars_format::scientific, places...).ptr;
-    Errno error;
-    if (!ReadPlain({text, static_cast<std::size_t>(end - text)}, '.', result, &error)) return errors::kBadNumber;
+    Errno error = 0;
+    ReadPlain({text, static_cast<std::size_t>(end - text)}, '.', result, &error);
     return error;
 }
 

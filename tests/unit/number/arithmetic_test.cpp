@@ -20,6 +20,25 @@ void ExpectRounded(const char* name, number::Errno error, const OCINumber& got, 
     }
 }
 
+// Two numbers of 40 digits; what their product has behind its 40th digit is 50...01 or 49...9.
+void NextToTie(RandomNumbers& numbers, OCINumber* a, OCINumber* b) {
+    std::string digits = "9";
+    while (digits.size() < 39) digits += static_cast<char>('0' + numbers.Below(10));
+    digits += '7';
+    *a = Number(digits);
+    mpz_t inverse, product, power;
+    mpz_init_set_str(inverse, digits.c_str(), 10);
+    mpz_init_set_str(product, numbers.Below(4) ? "5000000000000000000000000000000000000001"
+                                               : "4999999999999999999999999999999999999999", 10);
+    mpz_init_set_str(power, "10000000000000000000000000000000000000000", 10);
+    mpz_invert(inverse, inverse, power);
+    mpz_mul(product, product, inverse);
+    mpz_mod(product, product, power);
+    char text[45];
+    *b = Number(mpz_get_str(text, 10, product));
+    mpz_clears(inverse, product, power, nullptr);
+}
+
 // *value = the whole number next to it toward zero.
 void CutToWhole(Fraction& value) {
     mpz_tdiv_q(mpq_numref(static_cast<mpq_ptr>(value)), mpq_numref(static_cast<mpq_ptr>(value)),
@@ -40,9 +59,10 @@ TEST(NumberArithmetic, FourOperationsRoundTheExactResultOnce) {
     RandomNumbers numbers(1);
     for (int i = 0; i < 4000; ++i) {
         const int spread = i % 4 == 0 ? 62 : i % 4 == 1 ? 0 : 12;
-        const OCINumber a = numbers.Next(spread);
-        OCINumber b = i % 10 == 0 ? a : numbers.Next(spread);
+        OCINumber a = numbers.Next(spread), b = i % 10 == 0 ? a : numbers.Next(spread);
         if (i % 20 == 0) number::Neg(a, &b);
+        if (i % 20 == 4) NextToTie(numbers, &a, &b);
+        if (i % 5 == 1 && number::Mul(numbers.Next(spread), b, &a) != 0) a = b;    // next to a short quotient
         for (const auto& operation : operations) {
             Fraction left(a), right(b), exact;
             operation.exact(exact, left, right);
@@ -190,17 +210,26 @@ TEST(NumberArithmetic, BytesThatAreNoNumber) {
                                    {{22, 193, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2, 2}},
                                    {{2, 193, 0}},      {{2, 193, 102}},   {{2, 255, 102}},
                                    {{3, 193, 2, 255}}, {{3, 62, 1, 102}}, {{3, 62, 103, 102}}, {{2, 62, 102}}};
+    const number::Unary unary[] = {number::Assign, number::Abs, number::Neg, number::Ceil, number::Floor, number::Inc, number::Dec,
+                                   number::Sqrt, number::Exp, number::Ln, number::Sin, number::Cos, number::Tan, number::ArcSin,
+                                   number::ArcCos, number::ArcTan, number::HypSin, number::HypCos, number::HypTan};
+    const number::Binary binary[] = {number::Add, number::Sub, number::Mul, number::Div, number::Mod,
+                                     number::Power, number::Log, number::ArcTan2};
+    const OCINumber two = Number("2");
     for (const OCINumber& value : malformed) {
         OCINumber got;
         int tested = 0;
-        EXPECT_FALSE(number::IsValid(value)) << int{value.OCINumberPart[0]} << " " << int{value.OCINumberPart[1]};
-        EXPECT_EQ(number::Add(value, Number("1"), &got), 22060);
-        EXPECT_EQ(number::Sub(Number("1"), value, &got), 22060);
-        EXPECT_EQ(number::Sin(value, &got), 22060);
-        EXPECT_EQ(number::Compare(value, value, &tested), 22060);
-        EXPECT_EQ(number::Sign(value, &tested), 22060);
-        EXPECT_EQ(number::IsZero(value, &tested), 22060);
         double real = 0;
+        EXPECT_FALSE(number::IsValid(value)) << int{value.OCINumberPart[0]} << " " << int{value.OCINumberPart[1]};
+        for (const auto& function : unary) EXPECT_EQ(function(value, &got), 22060) << &function - unary;
+        for (const auto& function : binary)
+            EXPECT_TRUE(function(value, two, &got) == 22060 && function(two, value, &got) == 22060) << &function - binary;
+        for (const number::Scaled function : {number::Round, number::Trunc, number::Prec, number::Shift, number::IntPower})
+            EXPECT_EQ(function(value, 1, &got), 22060);
+        for (const number::Tested function : {number::Sign, number::IsInt, number::IsZero})
+            EXPECT_EQ(function(value, &tested), 22060);
+        EXPECT_EQ(number::Compare(value, two, &tested), 22060);
+        EXPECT_EQ(number::Compare(two, value, &tested), 22060);
         EXPECT_EQ(number::ToDouble(value, &real), 22060);
     }
 }
@@ -220,7 +249,7 @@ TEST(NumberArithmetic, BytesOfKnownValues) {
 TEST(NumberArithmetic, UnusualBytesOfTheSameValue) {
     const struct { OCINumber bytes; const char* value; } cases[] = {
         {{{2, 193, 6, 255, 0, 102, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7, 7}}, "5"}, {{{3, 194, 1, 6}}, "5"},
-        {{{2, 62, 96}}, "-5"}, {{{3, 193, 6, 1}}, "5"}, {{{2, 193, 1}}, "0"}};
+        {{{2, 62, 96}}, "-5"}, {{{3, 193, 6, 1}}, "5"}, {{{2, 193, 1}}, "0"}, {{{2, 128, 1}}, "0"}};
     for (const auto& c : cases) {
         OCINumber got;
         ASSERT_EQ(number::Add(c.bytes, Number("1"), &got), 0) << c.value;
@@ -242,7 +271,7 @@ TEST(NumberArithmetic, InfinitiesCompareButDoNotCompute) {
     EXPECT_EQ(got, minus);
     ASSERT_EQ(number::Neg(minus, &got), 0);
     EXPECT_EQ(got, plus);
-    const struct { OCINumber value; int sign; const char* text; number::Errno integer; } cases[] = {{plus, 1, "~", 22053}, {minus, -1, "-~", 22054}};
+    const struct { OCINumber value; int sign; const char* text; number::Errno integer; } cases[] = {{plus, 1, "~", 22053}, {{{1, 0, 7}}, -1, "-~", 22054}};
     for (const auto& c : cases) {
         int sign = 0, whole = 1, zero = 1;
         double real = 0;
