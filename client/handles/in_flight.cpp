@@ -22,16 +22,14 @@ constinit std::atomic<Epoch> current_epoch{1};
 constinit std::atomic<bool> somebody_waits_for_a_lock{false};
 [[gnu::tls_model("initial-exec")]] constinit thread_local Own own;
 
-static bool RegisterBarrier() {
-    return syscall(SYS_membarrier, MEMBARRIER_CMD_REGISTER_PRIVATE_EXPEDITED, 0, 0) == 0;
-}
-const bool system_barrier = RegisterBarrier();
-
 }  // namespace in_flight
 
 namespace {
 
 using namespace in_flight;
+
+bool RegisterBarrier() { return syscall(SYS_membarrier, MEMBARRIER_CMD_REGISTER_PRIVATE_EXPEDITED, 0, 0) == 0; }
+const bool system_barrier = RegisterBarrier();
 
 // The slot of the threads that have none of their own. They count themselves, and fence.
 constinit Slot guest_slot;
@@ -79,11 +77,12 @@ struct SlotKey {
     const bool made = pthread_key_create(&key, GiveUpSlot) == 0;
 };
 
-// Gives the thread a slot until it ends. False when there is no memory for it.
+// Gives the thread a slot until it ends. False when there is no memory for it, or no barrier.
 bool TakeSlot() {
     static const SlotKey key;
-    Slot* slot = key.made ? FreeSlot() : nullptr;
-    if (!slot && key.made) slot = NewSlot();
+    const bool can = key.made && system_barrier;
+    Slot* slot = can ? FreeSlot() : nullptr;
+    if (!slot && can) slot = NewSlot();
     if (!slot) return false;
     slots_taken.fetch_add(1, std::memory_order_relaxed);
     std::atomic_thread_fence(std::memory_order_seq_cst);    // who misses the count is seen by our look-ups

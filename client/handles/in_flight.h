@@ -34,7 +34,7 @@
 //     same holds for an object whose lock (SerialLock) is held when it is to be destroyed: nobody waits for the lock,
 //     whose holder is in a call and looks, having given it up, whether an object waits.
 // The barrier of R is the system's (membarrier), which makes every running thread fence: then a signal fence is enough
-// for T, which is what makes entering cheap. Where the system has none both fence.
+// for T, which is what makes entering cheap. Where the system has none both fence, and every thread is a guest.
 //
 // What a reader may hold, and until when. A pointer that Live gave: until the outermost CallInFlight of the thread
 // ends, LongCalls and callbacks included. What hangs below such an object, or what it belongs to: as long, since those
@@ -72,7 +72,8 @@ struct alignas(64) Slot {
     Slot* next = nullptr;
 };
 
-// What a thread knows of itself. Without a slot, which takes memory, it is a guest in one that all such threads share.
+// What a thread knows of itself. Without a slot, which takes memory and the system's barrier, it is a guest in one that all
+// such threads share.
 struct Own {
     Slot* slot = nullptr;
     unsigned depth = 0;           // calls within calls
@@ -83,14 +84,10 @@ struct Own {
 
 extern constinit std::atomic<Epoch> current_epoch;
 extern constinit std::atomic<bool> somebody_waits_for_a_lock;
-extern const bool system_barrier;
 [[gnu::tls_model("initial-exec")]] extern constinit thread_local Own own;
 
-// The thread's own side of the barrier.
-inline void Fence() noexcept {
-    if (system_barrier) [[likely]] std::atomic_signal_fence(std::memory_order_seq_cst);
-    else std::atomic_thread_fence(std::memory_order_seq_cst);
-}
+// The own side of the barrier, of a thread with a slot. Guests fence in earnest.
+inline void Fence() noexcept { std::atomic_signal_fence(std::memory_order_seq_cst); }
 
 inline Epoch Now() noexcept { return current_epoch.load(std::memory_order_acquire); }
 
@@ -113,7 +110,8 @@ void HandBack(Slot& slot) noexcept;
 
 // A lock that destroying an object needs was given up.
 inline void GaveUpLock() noexcept {
-    Fence();
+    if (own.slot) Fence();
+    else std::atomic_thread_fence(std::memory_order_seq_cst);
     if (somebody_waits_for_a_lock.load(std::memory_order_relaxed)) own.gave_up_lock = true;
 }
 

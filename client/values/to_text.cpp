@@ -52,24 +52,23 @@ bool AmountText(double value, Workspace& workspace, View& text) {
     char* end = begin;
     if (value < 0) *end++ = '-';
     if (units >= kUnits) end = std::to_chars(end, begin + workspace.small.size(), units / kUnits).ptr;
-    if (std::uint64_t rest = units % kUnits; rest != 0) {
+    if (const std::uint64_t rest = units % kUnits; rest != 0) {
         *end++ = '.';
-        for (std::uint64_t place = kUnits / 10; rest != 0; rest %= place, place /= 10)
-            *end++ = static_cast<char>('0' + rest / place);
+        for (const std::uint64_t digits : {rest / 1000, rest / 100, rest / 10, rest})
+            *end++ = static_cast<char>('0' + digits % 10);
+        while (end[-1] == '0') --end;
     }
     text = View(begin, static_cast<std::size_t>(end - begin));
     return true;
 }
 
-// With all digits that tell it from other reals. Infinities and what is no number have names; reals of usual size are
-// written directly, in the plain form of numbers.
-int BinaryRealText(const Datum& datum, Workspace& workspace, View& text) {
-    const double value = datum.real;
-    if (AmountText(value, workspace, text)) return 0;
+// What is no amount, with all digits that tell it from other reals. Infinities and what is no number have names; reals of
+// usual size are written directly, in the plain form of numbers.
+int OtherRealText(double value, Workspace& workspace, View& text) {
     if (std::isnan(value)) return text = "Nan", 0;
     if (std::isinf(value)) return text = value > 0 ? "Inf" : "-Inf", 0;
     const double magnitude = std::fabs(value);
-    if (magnitude != 0 && (magnitude < 1e-6 || magnitude >= 1e15)) {
+    if (magnitude < 1e-6 || magnitude >= 1e15) {
         OCINumber number;
         if (const int error = number::FromDouble(value, &number)) return error;
         return NumberText(number, workspace, text);
@@ -81,8 +80,12 @@ int BinaryRealText(const Datum& datum, Workspace& workspace, View& text) {
         ++begin;
         if (negative) *begin = '-';
     }
-    text = value == 0 ? View("0") : View(begin, static_cast<std::size_t>(end - begin));
+    text = {begin, static_cast<std::size_t>(end - begin)};
     return 0;
+}
+
+int BinaryRealText(const Datum& datum, Workspace& workspace, View& text) {
+    return AmountText(datum.real, workspace, text) ? 0 : OtherRealText(datum.real, workspace, text);
 }
 
 int SingleRealText(const Datum& datum, Workspace& workspace, View& text) {
@@ -99,7 +102,8 @@ std::ptrdiff_t SignificantDigits(View text) {
 
 // As a number that the engine has computed, or keeps, as a real.
 int RealText(const Datum& datum, Workspace& workspace, View& text) {
-    if (const int error = BinaryRealText(datum, workspace, text)) return error;
+    if (AmountText(datum.real, workspace, text)) return 0;    // with no more digits than that
+    if (const int error = OtherRealText(datum.real, workspace, text)) return error;
     if (SignificantDigits(text) <= number::kRealDigits) return 0;
     OCINumber number;
     if (const int error = number::FromReal15(datum.real, &number)) return error;
