@@ -3,7 +3,7 @@
 #include <algorithm>
 
 #include "date/language.h"
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "date/model.h"
 #include "date/parsed.h"
 #include "date/zone.h"
@@ -22,7 +22,7 @@ struct Word {
 constexpr Word kHalfDays[] = {{"a.m.", 0}, {"p.m.", 1}, {"am", 0}, {"pm", 1}};
 constexpr Word kEras[] = {{"a.d.", 1}, {"b.c.", -1}, {"ad", 1}, {"bc", -1}};
 
-bool IsPunctuation(char c) { return c > ' ' && c < '\x7f' && !IsLetter(c) && !IsDigit(c); }
+bool IsPunctuation(char c) { return c > ' ' && c < '\x7f' && !letters::IsLetter(c) && !letters::IsDigit(c); }
 bool IsSign(char c) { return c == '+' || c == '-'; }
 bool TakesSign(const Element& element) {
     return element.has_sign || element.field == Field::zone_hour || element.field == Field::zone_region;
@@ -92,7 +92,7 @@ private:
         }
     }
 
-    void SkipBlanks() { rest_ = WithoutLeadingBlanks(rest_); }
+    void SkipBlanks() { rest_ = letters::WithoutLeadingBlanks(rest_); }
 
     bool TakeChar(char wanted) {
         if (!rest_.starts_with(wanted)) return false;
@@ -119,7 +119,7 @@ private:
         }
         if (rest_.size() != before) return 0;
         // The mark is missing: what stands here must at least suit what comes next.
-        const bool fits = TakesNumber(next) ? IsDigit(c) || IsSign(c) : !TakesWord(next) || IsWordByte(c);
+        const bool fits = TakesNumber(next) ? letters::IsDigit(c) || IsSign(c) : !TakesWord(next) || letters::IsWordByte(c);
         if (!fits) return errors::kTextMismatch;
         return 0;
     }
@@ -127,14 +127,14 @@ private:
     Errno TakeQuoted(std::string_view wanted) {
         if (!exact_ && !wanted.starts_with(' ')) SkipBlanks();
         if (rest_.size() < wanted.size()) return errors::kTextEnds;
-        if (!StartsWithFolded(rest_, wanted)) return errors::kTextMismatch;
+        if (!letters::StartsWithFolded(rest_, wanted)) return errors::kTextMismatch;
         rest_.remove_prefix(wanted.size());
         return 0;
     }
 
     std::size_t CountDigits(std::size_t most) const {
         std::size_t count = 0;
-        while (count < rest_.size() && count < most && IsDigit(rest_[count])) ++count;
+        while (count < rest_.size() && count < most && letters::IsDigit(rest_[count])) ++count;
         return count;
     }
 
@@ -176,7 +176,7 @@ private:
     }
 
     Errno TakeMonth(const Element& element) {
-        if (exact_ || !IsWordByte(rest_.front())) return TakeNumber(element);
+        if (exact_ || !letters::IsWordByte(rest_.front())) return TakeNumber(element);
         return TakeName(element, language_.months, language_.short_months, errors::kBadMonth);
     }
 
@@ -186,8 +186,8 @@ private:
                    const std::array<std::string_view, count>& others, Errno otherwise) {
         std::size_t length = 0;
         const int found = FindName(names, exact_ ? names : others, rest_, &length);
-        if (found < 0) return count == 7 && !IsWordByte(rest_.front()) ? errors::kNoLetter : otherwise;
-        const std::size_t width = NameWidth(names), written = CharacterCount(rest_.substr(0, length));
+        if (found < 0) return count == 7 && !letters::IsWordByte(rest_.front()) ? errors::kNoLetter : otherwise;
+        const std::size_t width = NameWidth(names), written = letters::CharacterCount(rest_.substr(0, length));
         rest_.remove_prefix(length);
         for (std::size_t i = written; exact_ && filled_ && i < width && TakeChar(' '); ++i) continue;
         return parsed_.Set(element, found + 1, length);
@@ -196,11 +196,11 @@ private:
     template <std::size_t count>
     Errno TakeWord(const Element& element, const Word (&words)[count], Errno otherwise) {
         for (const Word& word : words) {
-            if (!StartsWithFolded(rest_, word.text)) continue;
+            if (!letters::StartsWithFolded(rest_, word.text)) continue;
             rest_.remove_prefix(word.text.size());
             return parsed_.Set(element, word.value, 0);
         }
-        return IsWordByte(rest_.front()) ? otherwise : errors::kNoLetter;
+        return letters::IsWordByte(rest_.front()) ? otherwise : errors::kNoLetter;
     }
 
     Errno TakeRadix() {
@@ -235,8 +235,8 @@ private:
 
     // Only tells which of two same hours is meant; the region's own rule decides that.
     Errno TakeZoneName() {
-        if (!IsLetter(rest_.front())) return errors::kNoZone;
-        while (!rest_.empty() && IsLetter(rest_.front())) rest_.remove_prefix(1);
+        if (!letters::IsLetter(rest_.front())) return errors::kNoZone;
+        while (!rest_.empty() && letters::IsLetter(rest_.front())) rest_.remove_prefix(1);
         return 0;
     }
 

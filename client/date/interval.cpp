@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "date/zone.h"
 #include "handles/errors.h"
 
@@ -72,7 +72,7 @@ public:
     // Digits; zeros before them do not count. False where none stand.
     bool Number(std::int64_t* value) {
         const std::size_t digits = DigitCount();
-        for (*value = 0; !rest_.empty() && IsDigit(rest_.front()); rest_.remove_prefix(1))
+        for (*value = 0; !rest_.empty() && letters::IsDigit(rest_.front()); rest_.remove_prefix(1))
             *value = std::min<std::int64_t>(*value * 10 + (rest_.front() - '0'), kSecond);
         return digits > 0;
     }
@@ -86,7 +86,7 @@ public:
 
 private:
     [[nodiscard]] std::size_t DigitCount() const {
-        return static_cast<std::size_t>(std::find_if_not(rest_.begin(), rest_.end(), IsDigit) - rest_.begin());
+        return static_cast<std::size_t>(std::find_if_not(rest_.begin(), rest_.end(), letters::IsDigit) - rest_.begin());
     }
     std::string_view rest_;
 };

@@ -1,7 +1,7 @@
 // The languages.
 #include "date/language.h"
 
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 
 namespace date {
@@ -54,7 +54,7 @@ const Language* FindLanguage(std::string_view name) noexcept {
     name = name.substr(0, name.find_first_of("_."));
     for (const Language& language : kLanguages) {
         for (const std::string_view known : language.names) {
-            if (EqualFolded(name, known)) return &language;
+            if (letters::EqualFolded(name, known)) return &language;
         }
     }
     return nullptr;
@@ -67,7 +67,7 @@ int FindName(const std::array<std::string_view, count>& full, const std::array<s
     *length = 0;
     for (std::size_t i = 0; i < count; ++i) {
         for (const std::string_view name : {full[i], brief[i]}) {
-            if (name.size() <= *length || !StartsWithFolded(text, name)) continue;
+            if (name.size() <= *length || !letters::StartsWithFolded(text, name)) continue;
             found = static_cast<int>(i);
             *length = name.size();
         }

@@ -7,7 +7,7 @@
 #include <string_view>
 
 #include "date/format.h"
-#include "date/letters.h"
+#include "platform/letters.h"
 
 namespace date {
 
@@ -29,7 +29,7 @@ struct Language {
 template <std::size_t count>
 constexpr std::size_t NameWidth(const std::array<std::string_view, count>& names) {
     std::size_t width = 0;
-    for (const std::string_view name : names) width = CharacterCount(name) > width ? CharacterCount(name) : width;
+    for (const std::string_view name : names) width = letters::CharacterCount(name) > width ? letters::CharacterCount(name) : width;
     return width;
 }
 

@@ -1,7 +1,7 @@
 // The elements of format models, one row each.
 #include "date/model.h"
 
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 
 namespace date {
@@ -87,12 +87,12 @@ constexpr Row kRows[] = {
     {"Y", Field::year, 1, kNumeric},
 };
 
-bool IsMark(char c) { return c == ' ' || (c > ' ' && c < '\x7f' && !IsLetter(c) && !IsDigit(c)); }
+bool IsMark(char c) { return c == ' ' || (c > ' ' && c < '\x7f' && !letters::IsLetter(c) && !letters::IsDigit(c)); }
 
 LetterCase CaseOf(std::string_view written) {
-    if (written.front() != ToUpper(written.front())) return LetterCase::lower;
+    if (written.front() != letters::ToUpper(written.front())) return LetterCase::lower;
     for (const char c : written.substr(1)) {
-        if (IsLetter(c)) return c == ToUpper(c) ? LetterCase::upper : LetterCase::capitalized;
+        if (letters::IsLetter(c)) return c == letters::ToUpper(c) ? LetterCase::upper : LetterCase::capitalized;
     }
     return LetterCase::upper;
 }
@@ -124,7 +124,7 @@ bool Model::TakeQuoted(Element* element) noexcept {
 
 bool Model::TakeNamed(Element* element) noexcept {
     for (const Row& row : kRows) {
-        if (!StartsWithFolded(rest_, row.name)) continue;
+        if (!letters::StartsWithFolded(rest_, row.name)) continue;
         const std::string_view from = rest_;
         rest_.remove_prefix(row.name.size());
         element->field = row.field;
@@ -146,8 +146,8 @@ bool Model::TakeNamed(Element* element) noexcept {
 // TH and SP, in either order.
 void Model::TakeSuffixes(Element* element) noexcept {
     for (int i = 0; i < 2; ++i) {
-        if (!element->ordinal && StartsWithFolded(rest_, "TH")) element->ordinal = true;
-        else if (!element->spelled && StartsWithFolded(rest_, "SP")) element->spelled = true;
+        if (!element->ordinal && letters::StartsWithFolded(rest_, "TH")) element->ordinal = true;
+        else if (!element->spelled && letters::StartsWithFolded(rest_, "SP")) element->spelled = true;
         else return;
         element->input = false;
         rest_.remove_prefix(2);

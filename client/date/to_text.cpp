@@ -2,7 +2,7 @@
 #include <cstring>
 
 #include "date/language.h"
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "date/model.h"
 #include "date/words.h"
 #include "date/zone.h"
@@ -44,7 +44,7 @@ public:
         bool word_start = true;
         for (std::size_t i = 0; i < text.size(); ++i) {
             const bool large = letters == LetterCase::upper || (letters == LetterCase::capitalized && word_start);
-            Put(large ? UpperByte(text, i) : text[i]);
+            Put(large ? letters::UpperByte(text, i) : text[i]);
             if (text[i] != '\xC3') word_start = text[i] == ' ' || text[i] == '-';
         }
     }
@@ -221,7 +221,7 @@ private:
 
     void PutName(std::string_view name, std::size_t width, const Element& element) {
         writer_.PutCased(name, element.letters);
-        if (filled_) writer_.PutBlanks(width - CharacterCount(name));
+        if (filled_) writer_.PutBlanks(width - letters::CharacterCount(name));
     }
 
     // Without a number of digits: microseconds, unless the value has more.

@@ -18,7 +18,7 @@
 #include <string>
 #include <vector>
 
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "date/zone_rules.h"
 #include "handles/errors.h"
 
@@ -76,7 +76,7 @@ bool IsRegionName(std::string_view name) {
     if (name.size() > 64) return false;
     bool part_start = true;
     for (const char c : name) {
-        if (c == '/' ? part_start : !IsLetter(c) && !IsDigit(c) && c != '+' && c != '-' && c != '_') return false;
+        if (c == '/' ? part_start : !letters::IsLetter(c) && !letters::IsDigit(c) && c != '+' && c != '-' && c != '_') return false;
         part_start = c == '/';
     }
     return !name.empty() && !part_start;
@@ -213,7 +213,7 @@ Errno MoveSeconds(std::int64_t seconds, DateTime* value) {
 // One or two digits, from the left.
 bool TakeNumber(std::string_view& text, int* value) {
     std::size_t count = 0;
-    for (*value = 0; count < text.size() && count < 2 && IsDigit(text[count]); ++count) {
+    for (*value = 0; count < text.size() && count < 2 && letters::IsDigit(text[count]); ++count) {
         *value = *value * 10 + (text[count] - '0');
     }
     text.remove_prefix(count);

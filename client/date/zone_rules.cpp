@@ -4,7 +4,7 @@
 #include <algorithm>
 
 #include "date/date.h"
-#include "date/letters.h"
+#include "platform/letters.h"
 
 namespace date {
 namespace {
@@ -47,7 +47,7 @@ private:
 
     bool Number(int* value) {
         std::size_t count = 0;
-        for (*value = 0; count < rest_.size() && count < 4 && IsDigit(rest_[count]); ++count) {
+        for (*value = 0; count < rest_.size() && count < 4 && letters::IsDigit(rest_[count]); ++count) {
             *value = *value * 10 + (rest_[count] - '0');
         }
         rest_.remove_prefix(count);
@@ -57,7 +57,7 @@ private:
     bool Name(std::string* name) {
         const bool bracketed = Take('<');
         std::size_t length = 0;
-        while (length < rest_.size() && (bracketed ? rest_[length] != '>' : IsLetter(rest_[length]))) ++length;
+        while (length < rest_.size() && (bracketed ? rest_[length] != '>' : letters::IsLetter(rest_[length]))) ++length;
         *name = rest_.substr(0, length);
         rest_.remove_prefix(length);
         return length >= 3 && (!bracketed || Take('>'));

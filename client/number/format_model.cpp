@@ -1,6 +1,6 @@
 #include "number/format_model.h"
 
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 
 namespace number {
@@ -31,7 +31,7 @@ private:
     [[nodiscard]] int Places() const { return model_.places_before + model_.places_after; }
 
     bool Take(std::string_view word) {
-        if (!date::StartsWithFolded(text_.substr(at_), word)) return false;
+        if (!letters::StartsWithFolded(text_.substr(at_), word)) return false;
         at_ += word.size();
         return true;
     }
@@ -40,7 +40,7 @@ private:
         if (Take("EEEE")) return Exponent();
         if (Take("MI")) return EndSign(Sign::trailing_minus);
         if (Take("PR")) return EndSign(Sign::brackets);
-        const char element = date::ToUpper(text_[at_++]);
+        const char element = letters::ToUpper(text_[at_++]);
         switch (element) {
             case '9': return Place(false);
             case '0': return Place(true);
@@ -134,7 +134,7 @@ private:
 // Zeros, then X or x.
 bool ParseHexadecimal(std::string_view text, FormatModel* model) {
     const std::size_t zeros = text.find_first_not_of('0');
-    if (zeros == std::string_view::npos || date::ToUpper(text[zeros]) != 'X') return false;
+    if (zeros == std::string_view::npos || letters::ToUpper(text[zeros]) != 'X') return false;
     if (text.find_first_not_of("xX", zeros) != std::string_view::npos) return false;
     model->kind = Kind::hexadecimal;
     model->lower_case = text[zeros] == 'x';
@@ -147,15 +147,15 @@ bool ParseHexadecimal(std::string_view text, FormatModel* model) {
 
 Errno ParseFormat(std::string_view text, FormatModel* model) noexcept {
     *model = FormatModel{};
-    if (date::StartsWithFolded(text, "FM")) {
+    if (letters::StartsWithFolded(text, "FM")) {
         model->fill = false;
         text.remove_prefix(2);
     }
-    if (date::EqualFolded(text, "TM") || date::EqualFolded(text, "TM9")) {
+    if (letters::EqualFolded(text, "TM") || letters::EqualFolded(text, "TM9")) {
         model->kind = Kind::shortest;
-    } else if (date::EqualFolded(text, "TME")) {
+    } else if (letters::EqualFolded(text, "TME")) {
         model->kind = Kind::shortest_scientific;
-    } else if (date::EqualFolded(text, "RN")) {
+    } else if (letters::EqualFolded(text, "RN")) {
         model->kind = Kind::roman;
         model->lower_case = text[0] == 'r';
     } else if (!ParseHexadecimal(text, model)) {

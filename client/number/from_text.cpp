@@ -1,7 +1,7 @@
 // Text to numbers by a model.
 #include <algorithm>
 
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 #include "number/decimal.h"
 #include "number/format.h"
@@ -137,13 +137,13 @@ private:
 };
 
 Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber* result) {
-    text = date::WithoutLeadingBlanks(text);
+    text = letters::WithoutLeadingBlanks(text);
     if (text.empty() || text.size() > static_cast<std::size_t>(model.places_before)) return errors::kBadNumberText;
     OCINumber value, sixteen, digit, product;
     SetZero(&value);
     FromInt64(16, &sixteen);
     for (const char c : text) {
-        const char letter = date::ToUpper(c);
+        const char letter = letters::ToUpper(c);
         const bool is_letter = letter >= 'A' && letter <= 'F';
         if (!IsDigit(c) && !is_letter) return errors::kBadNumberText;
         FromInt64(is_letter ? letter - 'A' + 10 : c - '0', &digit);
@@ -156,10 +156,10 @@ Errno ReadHexadecimal(std::string_view text, const FormatModel& model, OCINumber
 
 // Reads what it can digit by digit; the letters must then be those that the value is spelled with.
 Errno ReadRoman(std::string_view text, OCINumber* result) {
-    text = date::WithoutLeadingBlanks(text);
+    text = letters::WithoutLeadingBlanks(text);
     if (text.empty() || text.size() > kRomanWidth) return errors::kBadNumberText;
     char upper[kRomanWidth];
-    std::transform(text.begin(), text.end(), upper, date::ToUpper);
+    std::transform(text.begin(), text.end(), upper, letters::ToUpper);
     const std::string_view capitals(upper, text.size());
     std::string_view rest = capitals;
     int value = 0;

@@ -1,5 +1,5 @@
 // The NLS text of a conversion: settings, each a name, an equals sign and a value.
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 #include "number/format.h"
 
@@ -45,12 +45,12 @@ bool SetNumericCharacters(std::string_view value, Nls* nls) {
 
 bool SetText(std::string_view value, std::string_view* setting) {
     *setting = value;
-    return date::CharacterCount(value) <= kMostCurrency;
+    return letters::CharacterCount(value) <= kMostCurrency;
 }
 
 bool SetTerritory(std::string_view value, Nls* nls) {
     for (const auto& row : kTerritories) {
-        if (!date::EqualFolded(value, row.territory)) continue;
+        if (!letters::EqualFolded(value, row.territory)) continue;
         nls->iso_currency = row.currency;
         return true;
     }
@@ -58,23 +58,23 @@ bool SetTerritory(std::string_view value, Nls* nls) {
 }
 
 bool Set(std::string_view name, std::string_view value, Nls* nls) {
-    if (date::EqualFolded(name, "NLS_NUMERIC_CHARACTERS")) return SetNumericCharacters(value, nls);
-    if (date::EqualFolded(name, "NLS_CURRENCY")) return SetText(value, &nls->currency);
-    if (date::EqualFolded(name, "NLS_DUAL_CURRENCY")) return SetText(value, &nls->dual_currency);
-    if (date::EqualFolded(name, "NLS_ISO_CURRENCY")) return SetTerritory(value, nls);
+    if (letters::EqualFolded(name, "NLS_NUMERIC_CHARACTERS")) return SetNumericCharacters(value, nls);
+    if (letters::EqualFolded(name, "NLS_CURRENCY")) return SetText(value, &nls->currency);
+    if (letters::EqualFolded(name, "NLS_DUAL_CURRENCY")) return SetText(value, &nls->dual_currency);
+    if (letters::EqualFolded(name, "NLS_ISO_CURRENCY")) return SetTerritory(value, nls);
     return false;
 }
 
 }  // namespace
 
 Errno ParseNls(std::string_view text, Nls* nls) noexcept {
-    for (text = date::WithoutLeadingBlanks(text); !text.empty(); text = date::WithoutLeadingBlanks(text)) {
+    for (text = letters::WithoutLeadingBlanks(text); !text.empty(); text = letters::WithoutLeadingBlanks(text)) {
         std::size_t length = 0;
-        while (length < text.size() && (text[length] == '_' || date::IsLetter(text[length]))) ++length;
+        while (length < text.size() && (text[length] == '_' || letters::IsLetter(text[length]))) ++length;
         const std::string_view name = text.substr(0, length);
-        text = date::WithoutLeadingBlanks(text.substr(length));
+        text = letters::WithoutLeadingBlanks(text.substr(length));
         if (!text.starts_with('=')) return errors::kBadNls;
-        text = date::WithoutLeadingBlanks(text.substr(1));
+        text = letters::WithoutLeadingBlanks(text.substr(1));
         std::string_view value;
         if (!TakeValue(&text, &value) || !Set(name, value, nls)) return errors::kBadNls;
     }

@@ -1,6 +1,6 @@
 // Numbers to text by a model. A text is put together twice: once to know its length, then behind the blanks that fill
 // it up to the width of the model.
-#include "date/letters.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 #include "number/decimal.h"
 #include "number/format.h"
@@ -135,7 +135,7 @@ void PutNumber(const Job& job, Writer* out) {
 // Characters of the widest text that the model gives.
 std::size_t Width(const Job& job) {
     const FormatModel& model = job.model;
-    const std::size_t money = model.currency == FormatModel::Currency::none ? 0 : date::CharacterCount(Money(job));
+    const std::size_t money = model.currency == FormatModel::Currency::none ? 0 : letters::CharacterCount(Money(job));
     const std::size_t point = model.point == '.' || model.point == 'D';
     const std::size_t signs = model.sign == FormatModel::Sign::brackets ? 2 : 1;
     if (model.scientific) {
@@ -155,7 +155,7 @@ template <class Put> void PutFilled(bool fill, std::size_t width, Writer* out, P
     put(&trial);
     if (fill) {
         const std::size_t bytes = std::min(trial.Length(), sizeof counted);
-        const std::size_t extra = bytes - date::CharacterCount({counted, bytes});
+        const std::size_t extra = bytes - letters::CharacterCount({counted, bytes});
         out->Repeat(' ', static_cast<std::ptrdiff_t>(width + extra) - static_cast<std::ptrdiff_t>(trial.Length()));
     }
     put(out);

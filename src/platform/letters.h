@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <string_view>
 
-namespace date {
+namespace letters {
 
 constexpr bool IsDigit(char c) { return c >= '0' && c <= '9'; }
 constexpr bool IsLetter(char c) { return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z'); }
@@ -46,4 +46,4 @@ constexpr std::size_t CharacterCount(std::string_view text) {
     return count;
 }
 
-}  // namespace date
+}  // namespace letters
