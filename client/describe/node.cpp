@@ -50,7 +50,7 @@ std::shared_ptr<const Node> Columns(std::vector<engine::Column> columns) {
 }
 
 // Of a schema's objects the engine may tell the kinds; the database's members are schemas.
-std::shared_ptr<const Node> Members(const engine::ObjectDescription& object) {
+std::shared_ptr<const Node> Members(engine::ObjectDescription& object) {
     const bool of_schema = object.kind == engine::ObjectKind::schema;
     auto list = List(of_schema ? OCI_LTYPE_SCH_OBJ : OCI_LTYPE_DB_SCH, 0);
     for (std::size_t index = 0; index < object.members.size(); ++index) {
@@ -62,7 +62,7 @@ std::shared_ptr<const Node> Members(const engine::ObjectDescription& object) {
             node->object.kind = told ? object.member_kinds[index] : engine::ObjectKind::any;
             node->object.schema = object.name;
         }
-        node->object.name = object.members[index];
+        node->object.name = std::move(object.members[index]);
         node->type = RowOf(node->object.kind).type;
         list->members.push_back(std::move(node));
     }
@@ -91,9 +91,6 @@ std::shared_ptr<const Node> DescribedObject(engine::ObjectDescription object, Da
         case engine::ObjectKind::database: node->list = Members(object); break;
         default: break;
     }
-    object.columns.clear();
-    object.members.clear();
-    object.member_kinds.clear();
     node->object = std::move(object);
     return node;
 }

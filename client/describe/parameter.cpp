@@ -31,7 +31,7 @@ std::string_view Parameter::Kept(std::string_view utf8) const {
 
 Status Parameter::GetMember(std::uint32_t position, void** out) {
     const std::shared_ptr<const describe::Node> list = node_;
-    if (!list || list->shown != describe::Shown::list || position < list->first) return Error(errors::kNoParameter);
+    if (!list || position < list->first) return Error(errors::kNoParameter);
     const std::size_t place = position - list->first;
     if (place >= list->members.size()) return Error(errors::kNoParameter);
     if (!out) return Error(errors::kNullArgument);

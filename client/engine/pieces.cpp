@@ -115,6 +115,17 @@ bool IsNumber(std::string_view piece) {
     return !piece.empty() && (IsDigit(piece[0]) || (piece[0] == '.' && piece.size() > 1));
 }
 
+bool ReadObjectName(std::string_view text, ObjectName& read) {
+    const PieceList pieces = Split(text);
+    const bool qualified = pieces.size() == 3 && pieces[1] == ".";
+    if (pieces.size() != 1 && !qualified) return false;
+    read = {qualified ? pieces.front() : std::string_view(), pieces.back()};
+    const auto is_closed = [](std::string_view piece) {
+        return IsName(piece) && (piece.front() != '"' || (piece.size() > 2 && piece.back() == '"'));
+    };
+    return is_closed(pieces.front()) && is_closed(pieces.back());
+}
+
 std::string PlainName(std::string_view piece) {
     const bool quoted = piece.size() >= 2 && (piece[0] == '"' || piece[0] == '`' || piece[0] == '[');
     return quoted ? Unquoted(piece) : std::string(piece);

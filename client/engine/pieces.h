@@ -47,6 +47,12 @@ bool IsName(std::string_view piece);       // a word or quoted name
 bool IsLiteral(std::string_view piece);    // 'text'
 bool IsNumber(std::string_view piece);     // 12, .5, 1e-3; no sign
 
+// A name, perhaps with its schema's before it: "s.t". False for anything else.
+struct ObjectName {
+    std::string_view schema, name;    // as they are written
+};
+bool ReadObjectName(std::string_view text, ObjectName& read);
+
 // A name without its quotes; the text of a literal.
 std::string PlainName(std::string_view piece);
 std::string PlainText(std::string_view literal);

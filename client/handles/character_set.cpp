@@ -74,9 +74,8 @@ public:
         char16_t unit = 0;
         char *input = &byte, *output = reinterpret_cast<char*>(&unit);
         std::size_t unread = 1, room = sizeof unit;
-        iconv(descriptor_, nullptr, nullptr, nullptr, nullptr);
-        const bool read = iconv(descriptor_, &input, &unread, &output, &room) == 0;
-        return read && room == 0 ? unit : kNone;
+        iconv(descriptor_, &input, &unread, &output, &room);    // what stands for nothing leaves the room
+        return room == 0 ? unit : kNone;
     }
 
 private:
@@ -156,7 +155,7 @@ std::uint16_t IdOfLocale() noexcept {
     if (!locale) return kUtf8;
     std::uint16_t id = kUtf8;
     for (const CharacterSet& set : kSets)
-        if (set.id != 1 && *set.code_set && strcasecmp(set.code_set, nl_langinfo_l(CODESET, locale)) == 0) id = set.id;
+        if (set.id != 1 && strcasecmp(set.code_set, nl_langinfo_l(CODESET, locale)) == 0) id = set.id;
     freelocale(locale);
     return id;
 }
@@ -215,15 +214,10 @@ bool PartToUtf8(const CharacterSet& set, std::string_view part, bool last, std::
 
 std::size_t Whole(const CharacterSet& set, std::string_view text, std::size_t room) noexcept {
     if (text.size() <= room) return text.size();
-    switch (set.form) {
-        case Form::utf8: return utf::WholeUtf8(text, room);
-        case Form::utf16: return utf::WholeUtf16(text, room);
-        case Form::bytes: return room;
-        case Form::utf16_high_first: break;
-    }
+    if (set.form == Form::bytes) return room;
+    if (set.form == Form::utf8) return utf::WholeUtf8(text, room);
     room = room / 2 * 2;
-    const bool torn_pair = room > 0 && (static_cast<unsigned char>(text[room - 2]) & 0xFC) == 0xD8;
-    return torn_pair ? room - 2 : room;
+    return room > 0 && BeginsPair(set, text.substr(room - 2)) ? room - 2 : room;
 }
 
 }  // namespace charset

@@ -21,12 +21,6 @@ inline std::size_t WholeUtf8(std::string_view text, std::size_t room) {
     while (room > 0 && (static_cast<unsigned char>(text[room]) & 0xC0) == 0x80) --room;
     return room;
 }
-inline std::size_t WholeUtf16(std::string_view text, std::size_t room) {
-    if (text.size() <= room) return text.size();
-    room = room / 2 * 2;
-    const bool torn_pair = room > 0 && (static_cast<unsigned char>(text[room - 1]) & 0xFC) == 0xD8;
-    return torn_pair ? room - 2 : room;
-}
 
 // The bytes of a UTF-16 text before its first zero pair, looking no further than `limit` bytes.
 inline std::size_t Utf16Length(const void* text, std::size_t limit) {

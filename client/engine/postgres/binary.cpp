@@ -14,6 +14,7 @@
 namespace engine::postgres {
 namespace {
 
+constexpr std::uint16_t kPositive = 0;
 constexpr std::uint16_t kNegative = 0x4000;
 constexpr std::uint16_t kNotANumber = 0xC000;
 constexpr std::uint16_t kPlusInfinity = 0xD000;
@@ -23,16 +24,15 @@ constexpr int kBase = 10000;
 
 constexpr std::int64_t kSecond = 1'000'000;
 constexpr std::int64_t kDay = 86400 * kSecond;
+constexpr std::chrono::sys_days kEpoch = std::chrono::year(2000) / 1 / 1;
 
-std::size_t PutHeader(int count, int weight, std::uint16_t sign, int scale, char* bytes) {
+std::size_t PutHeader(std::uint16_t sign, char* bytes, int count = 0, int weight = 0, int scale = 0) {
     Put(static_cast<std::int16_t>(count), bytes);
     Put(static_cast<std::int16_t>(weight), bytes + 2);
     Put(sign, bytes + 4);
     Put(static_cast<std::int16_t>(scale), bytes + 6);
     return kHeader + 2 * static_cast<std::size_t>(count);
 }
-
-int FloorHalf(int value) { return value >= 0 ? value / 2 : -((1 - value) / 2); }
 
 }  // namespace
 
@@ -41,11 +41,11 @@ std::size_t NumericFrom(const OCINumber& number, char* bytes) noexcept {
     if (number::Unpack(number, &digits) != 0) {
         if (!number::IsValid(number)) return 0;
         const bool negative = number.OCINumberPart[0] == 1;
-        return PutHeader(0, 0, negative ? kMinusInfinity : kPlusInfinity, 0, bytes);
+        return PutHeader(negative ? kMinusInfinity : kPlusInfinity, bytes);
     }
-    if (digits.IsZero()) return PutHeader(0, 0, 0, 0, bytes);
+    if (digits.IsZero()) return PutHeader(kPositive, bytes);
     const int pairs = static_cast<int>(number::CountDigits(digits));
-    const int weight = FloorHalf(digits.exponent);
+    const int weight = digits.exponent >> 1;    // of the base below
     const int before = 2 * weight + 1 - digits.exponent;    // pairs of the first digit in front of the number's: 0 or 1
     const int count = (before + pairs + 1) / 2;
     const auto pair = [&](int index) {
@@ -57,18 +57,16 @@ std::size_t NumericFrom(const OCINumber& number, char* bytes) noexcept {
     }
     const int last = digits.exponent - pairs + 1;    // the last pair's power of 100
     const int scale = last >= 0 ? 0 : -2 * last - (number::DigitAt(digits, pairs - 1) % 10 == 0);
-    return PutHeader(count, weight, digits.negative ? kNegative : 0, scale, bytes);
+    return PutHeader(digits.negative ? kNegative : kPositive, bytes, count, weight, scale);
 }
 
 int NumericTo(std::string_view bytes, NumericValue& value) noexcept {
-    if (bytes.size() < kHeader) return errors::kInvalidNumber;
     const int count = Get<std::int16_t>(bytes.data());
     const int weight = Get<std::int16_t>(bytes.data() + 2);
     const auto sign = Get<std::uint16_t>(bytes.data() + 4);
     const char* const digits = bytes.data() + kHeader;
     if (sign == kNotANumber) return errors::kInvalidNumber;
     if (sign == kPlusInfinity || sign == kMinusInfinity) return errors::kNumericOverflow;
-    if (count < 0 || bytes.size() < kHeader + 2 * static_cast<std::size_t>(count)) return errors::kInvalidNumber;
     value.is_integer = count <= weight + 1 && weight < 4;    // below 10^16
     if (value.is_integer) {
         value.integer = 0;
@@ -95,15 +93,15 @@ int NumericTo(std::string_view bytes, NumericValue& value) noexcept {
 // ---- Times
 
 int DaysTo(std::int32_t days, date::DateTime& value) noexcept {
-    constexpr std::int32_t kLimit = 5'000'000;    // the calendar's years lie well within
-    if (days < -kLimit || days > kLimit) return errors::kBadYear;
-    const std::chrono::sys_days epoch = std::chrono::year(2000) / 1 / 1;
-    const std::chrono::year_month_day date(epoch + std::chrono::days(days));
+    constexpr std::chrono::sys_days kFirst = std::chrono::year(date::kMinYear + 1) / 1 / 1;    // 1 BC is the year 0 there
+    constexpr std::chrono::sys_days kLast = std::chrono::year(date::kMaxYear) / 12 / 31;
+    if (days < (kFirst - kEpoch).count() || days > (kLast - kEpoch).count()) return errors::kBadYear;
+    const std::chrono::year_month_day date(kEpoch + std::chrono::days(days));
     const int year = static_cast<int>(date.year());
-    value.year = static_cast<std::int16_t>(year > 0 ? year : year - 1);    // 1 BC is the year 0 there
+    value.year = static_cast<std::int16_t>(year > 0 ? year : year - 1);
     value.month = static_cast<std::uint8_t>(static_cast<unsigned>(date.month()));
     value.day = static_cast<std::uint8_t>(static_cast<unsigned>(date.day()));
-    return value.year < date::kMinYear || value.year > date::kMaxYear ? errors::kBadYear : 0;
+    return 0;
 }
 
 int MicrosecondsTo(std::int64_t microseconds, date::DateTime& value) noexcept {
@@ -130,8 +128,7 @@ int MicrosecondsFrom(const date::DateTime& given, std::int64_t& microseconds) no
     const std::chrono::year_month_day date(std::chrono::year(year), std::chrono::month(value.month),
                                            std::chrono::day(value.day));
     if (!date.ok()) return errors::kBadDayForMonth;
-    const std::chrono::sys_days epoch = std::chrono::year(2000) / 1 / 1;
-    const std::int64_t days = (std::chrono::sys_days(date) - epoch).count();
+    const std::int64_t days = (std::chrono::sys_days(date) - kEpoch).count();
     microseconds = days * kDay + ((value.hour * 60 + value.minute) * 60 + value.second) * kSecond +
                    value.nanosecond / 1000;
     return 0;

@@ -1,8 +1,10 @@
 // Describing tables, views, sequences, schemas and the database, from the catalogue; changing passwords.
 #include <cstdlib>
+#include <memory>
 #include <string>
 #include <vector>
 
+#include "engine/pieces.h"
 #include "engine/postgres/connection.h"
 #include "engine/postgres/types.h"
 #include "handles/errors.h"
@@ -10,28 +12,10 @@
 namespace engine::postgres {
 namespace {
 
-// A word or a quoted one, perhaps with its schema's before it. False for anything else.
-bool ReadName(std::string_view text, std::vector<std::string>& parts) {
-    const auto is_letter = [](char c) {
-        return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' || c == '$' ||
-               c == '#' || (c & 0x80) != 0;
-    };
-    for (std::size_t at = 0;; ++at) {
-        std::string part;
-        if (at < text.size() && text[at] == '"') {
-            const std::size_t end = text.find('"', at + 1);
-            if (end == std::string_view::npos) return false;
-            part = text.substr(at, end + 1 - at);
-            at = end + 1;
-        } else {
-            while (at < text.size() && is_letter(text[at])) part += text[at++];
-        }
-        if (part.empty() || part == "\"\"" || parts.size() == 2) return false;
-        parts.push_back(std::move(part));
-        if (at == text.size()) return true;
-        if (text[at] != '.') return false;
-    }
-}
+struct Freeing {
+    void operator()(char* text) const noexcept { PQfreemem(text); }
+};
+using LibpqText = std::unique_ptr<char, Freeing>;
 
 std::string Text(const Result& result, int row, int column) { return PQgetvalue(result.get(), row, column); }
 std::int64_t Integer(const Result& result, int column) {
@@ -69,20 +53,19 @@ constexpr const char* kSchemas =
 Status PgConnection::Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) {
     const bool wants_table = kind == ObjectKind::table || kind == ObjectKind::view;
     const Status missing = Refused(wants_table ? errors::kNoSuchTable : errors::kNoSuchObject);
-    std::vector<std::string> parts;
-    if (!ReadName(name, parts)) return missing;
-    const std::string schema = parts.size() == 2 ? StoredName(parts[0]) : "";
-    const std::string plain = StoredName(parts.back());
+    ObjectName parts;
+    if (!ReadObjectName(name, parts)) return missing;
+    const std::string schema = StoredName(parts.schema), plain = StoredName(parts.name);
     Result found;
     Result rows;
     ObjectDescription described;
     Status status;
     if (kind == ObjectKind::schema || kind == ObjectKind::database) {
         const bool is_schema = kind == ObjectKind::schema;
-        status = Ask(is_schema ? kSchema : kDatabase, {plain}, found);
-        if (status.Ok() && (parts.size() == 2 || PQntuples(found.get()) == 0)) return missing;
-        if (status.Ok()) status = is_schema ? Ask(kMembers, {plain}, rows) : Ask(kSchemas, {}, rows);
-        if (!status.Ok()) return status;
+        if (!schema.empty()) return missing;
+        if (status = Ask(is_schema ? kSchema : kDatabase, {plain}, found); !status.Ok()) return status;
+        if (PQntuples(found.get()) == 0) return missing;
+        if (status = is_schema ? Ask(kMembers, {plain}, rows) : Ask(kSchemas, {}, rows); !status.Ok()) return status;
         described.kind = kind;
         described.name = ShownText(found, 0, 0);
         for (int row = 0; row < PQntuples(rows.get()); ++row) {
@@ -135,12 +118,10 @@ Status PgConnection::ChangePassword(const std::string& user, const std::string& 
     if (status.Number() == errors::kBadLogon) return Refused(errors::kBadOldPassword);
     if (!status.Ok()) return status;
     // What is sent is what the server keeps of a password.
-    char* const kept = PQencryptPasswordConn(wire_->Libpq(), new_password.c_str(), role.c_str(), "scram-sha-256");
-    char* const name = PQescapeIdentifier(wire_->Libpq(), role.data(), role.size());
-    if (kept && name) status = wire_->Run(("alter role " + std::string(name) + " password '" + kept + "'").c_str());
-    else status = Refused(errors::kOutOfMemory);
-    PQfreemem(kept);
-    PQfreemem(name);
+    const LibpqText kept(PQencryptPasswordConn(wire_->Libpq(), new_password.c_str(), role.c_str(), "scram-sha-256"));
+    const LibpqText name(PQescapeIdentifier(wire_->Libpq(), role.data(), role.size()));
+    if (!kept || !name) return Refused(errors::kOutOfMemory);
+    status = wire_->Run((std::string("alter role ") + name.get() + " password '" + kept.get() + "'").c_str());
     if (status.Ok() && RoleName(credentials_.user) == role) credentials_.password = new_password;
     return status;
 }

@@ -9,6 +9,7 @@
 #include <utility>
 
 #include "date/format.h"
+#include "engine/pieces.h"
 #include "handles/errors.h"
 #include "oci.h"
 
@@ -125,7 +126,7 @@ int GiveInterval(std::int64_t months, std::int64_t days, std::int64_t microsecon
         interval = {date::Span::day_second, all / kSecond, static_cast<std::int32_t>(all % kSecond * 1000)};
     }
     std::size_t length = 0;
-    const auto fraction = static_cast<unsigned>(of_months ? 0 : std::min(digits, kMostFraction));
+    const auto fraction = static_cast<unsigned>(std::clamp(digits, 0, kMostFraction));
     const int error = date::ToText(interval, date::LeadingDigits(interval), fraction, room.interval, &length);
     SetView(value, Kind::text, room.interval, length);
     return error;
@@ -203,7 +204,7 @@ int TextToInterval(std::string_view text, ValueRoom& room, Datum& value) {
     if (const int error = date::FromText(whole, span, &read)) return error;
     if (is_negative) read = date::Negative(read);
     if (span == date::Span::year_month) return GiveInterval(read.whole, 0, 0, digits, room, value);
-    return GiveInterval(0, 0, read.whole * 1'000'000 + read.nanosecond / 1000, digits, room, value);
+    return GiveInterval(0, read.whole / 86400, read.whole % 86400 * 1'000'000 + read.nanosecond / 1000, digits, room, value);
 }
 
 int TextToTupleId(std::string_view text, ValueRoom& room, Datum& value) {
@@ -363,9 +364,9 @@ std::string ShownName(std::string_view name) {
     return upper && lower ? std::string(name) : other;
 }
 
-std::string StoredName(const std::string& part) {
-    if (part.starts_with('"')) return ShownName(std::string_view(part).substr(1, part.size() - 2));
-    std::string name = part;
+std::string StoredName(std::string_view part) {
+    if (part.starts_with('"')) return ShownName(PlainName(part));
+    std::string name(part);
     for (char& c : name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
     return name;
 }

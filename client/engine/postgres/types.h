@@ -31,7 +31,7 @@ bool IsLob(const Column& column);
 // A name as the application sees it, and the other way round: all of it in the other letter case, unless it has both. What
 // is written without quotes is in upper case there and in lower case here.
 std::string ShownName(std::string_view name);
-std::string StoredName(const std::string& part);    // of a word or a quoted one
+std::string StoredName(std::string_view part);    // of a word or a quoted one
 
 // Room for a value that the server has in another form.
 union ValueRoom {

@@ -140,17 +140,16 @@ Status SqliteConnection::Describe(std::string_view name, ObjectKind kind, Object
     const Status missing = Error(wants_table ? errors::kNoSuchTable : errors::kNoSuchObject);
     ObjectDescription described;
     Status status;
-    const std::vector<std::string_view> pieces = Split(name);
-    const bool qualified = pieces.size() == 3 && pieces[1] == ".";
-    if (pieces.size() != 1 && !qualified) return missing;
-    const std::string plain = PlainName(pieces.back());
+    ObjectName parts;
+    if (!ReadObjectName(name, parts)) return missing;
+    const std::string plain = PlainName(parts.name);
     if (kind == ObjectKind::schema || kind == ObjectKind::database) {
-        if (qualified) return missing;
+        if (!parts.schema.empty()) return missing;
         status = kind == ObjectKind::schema ? DescribeSchema(Database(), plain, described)
                                             : DescribeDatabase(*this, plain, described);
     } else if (wants_table || kind == ObjectKind::any) {
         Found found;
-        status = Find(Database(), qualified ? PlainName(pieces.front()) : std::string(), plain, found);
+        status = Find(Database(), PlainName(parts.schema), plain, found);
         if (status.Failed()) return status;
         if (found.type.empty()) return missing;
         status = DescribeTable(Database(), found, plain, described);

@@ -132,6 +132,7 @@ TEST_P(Contract, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
     ASSERT_EQ(Run("insert into t values(3)"), 0);
     ASSERT_TRUE(Prepared("savepoint here")->ExecuteArray(rows, {}, all).Ok());
     EXPECT_EQ(all.affected, 11u) << "nothing is changed";
+    EXPECT_EQ(all.executed, 2u);
 }
 
 // Long enough for an engine to hand it over in another way.
@@ -395,6 +396,13 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
     ASSERT_EQ(Answer(connection_->Prepare(xid, read_only)), 0);
     EXPECT_TRUE(read_only) << "nothing was changed";
     EXPECT_EQ(Answer(other->CommitPrepared(xid)), 24756);
+    xid = {.format = 7, .global_length = 3, .branch_length = 1, .data = {'a', 'b', 'c', 'd'}};
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
+    EXPECT_EQ(Query("select pg_current_xact_id() is null"), "0;");    // a change that only the server knows of
+    ASSERT_EQ(Answer(connection_->Prepare(xid, read_only)), 0);
+    EXPECT_FALSE(read_only);
+    EXPECT_EQ(server_->RunHere("select gid from pg_prepared_xacts where database = current_database()"), "kelp.7.YWJj.ZA");
+    EXPECT_EQ(Answer(other->RollbackPrepared(xid)), 0);
 }
 
 // ---- Open queries
@@ -821,6 +829,7 @@ TEST_P(Contract, TablesAndViewsAreDescribedAsTheirRowsAre) {
     const std::string schema = object.schema;
     ASSERT_EQ(Answer(connection_->Describe(schema + ".\"T\"", engine::ObjectKind::any, object)), 0);
     ASSERT_EQ(Answer(connection_->Describe(schema, engine::ObjectKind::schema, object)), 0);
+    EXPECT_EQ(object.name, schema);
     const std::set<std::string> members(object.members.begin(), object.members.end());
     EXPECT_EQ(members, (std::set<std::string>{"T", "W"}));
     ASSERT_EQ(object.member_kinds.size(), 2u);
@@ -837,8 +846,13 @@ TEST_P(Contract, TablesAndViewsAreDescribedAsTheirRowsAre) {
         {"w", engine::ObjectKind::table, 942},          {"nowhere.t", engine::ObjectKind::table, 942},
         {"t", engine::ObjectKind::sequence, 4043},      {"t", engine::ObjectKind::synonym, 4043},
         {"nowhere", engine::ObjectKind::schema, 4043},  {"nowhere", engine::ObjectKind::database, 4043},
-        {"", engine::ObjectKind::any, 4043},            {"a b", engine::ObjectKind::any, 4043}};
+        {"t.t", engine::ObjectKind::schema, 4043},      {"t.t", engine::ObjectKind::database, 4043}};
     for (const auto& c : missing) EXPECT_EQ(Answer(connection_->Describe(c.name, c.kind, object)), c.number) << c.name;
+    MustRun("create table \"a b\"(n integer)", "create table \"a;\"\"\"(n integer)", "create table \"1t\"(n integer)");
+    for (const std::string name : {"\"A B\"", "\"A;\"\"\"", "\"1T\""})
+        EXPECT_EQ(Answer(connection_->Describe(name, engine::ObjectKind::table, object)), 0) << name;
+    for (const std::string name : {"", "a b", "a;", "a;\"", "1t", "'t'", "\"tx", "\"\"", "\"\".t", ".t", "t.", "t;", "t t", "t;t", "t.t.t"})
+        EXPECT_EQ(Answer(connection_->Describe(name, engine::ObjectKind::table, object)), 942) << name;
 }
 
 // ---- Large objects, of the engines that have them
@@ -1144,8 +1158,9 @@ TEST_P(ServerObjects, AreWrittenWhereTheyLie) {
 }
 
 TEST_P(ServerObjects, AreReadAsTheyAreNow) {
+    MustRun("create view w as select * from o");
     const Kept lists[] = {Plain("select c from o where k = 3"), Plain("select o.c from o, l where o.k = 3"),
-                          Plain("select distinct c from o where k = 3")};
+                          Plain("select distinct c from o where k = 3"), Plain("select c from w where k = 3")};
     auto query = Opened("select c, k from o where k <> 2 order by k");
     Taking rows(*connection_->Lobs());
     bool more = true;

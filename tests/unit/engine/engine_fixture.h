@@ -59,14 +59,19 @@ inline OCINumber Number(const char* text) {
     return number;
 }
 
+inline std::string Digits(std::string_view bytes) {
+    std::string text;
+    char digits[3];
+    for (const char byte : bytes) text.append(digits, std::snprintf(digits, 3, "%02x", static_cast<unsigned char>(byte)));
+    return text;
+}
+
 inline std::string Shown(const Datum& value) {
     switch (value.kind) {
         case Kind::null: return "null";
         case Kind::integer: return std::to_string(value.integer);
         case Kind::row_id: {
-            std::string text = "row ";
-            char digits[3];
-            for (const auto byte : value.Row().bytes) text.append(digits, std::snprintf(digits, 3, "%02x", byte));
+            const std::string text = "row " + Digits(value.Text());
             return value.length == sizeof(engine::RowId) ? text : "row of " + std::to_string(value.length);
         }
         case Kind::real: {
@@ -80,7 +85,7 @@ inline std::string Shown(const Datum& value) {
             number::ToPlainText(value.Number(), '.', text, &length);
             return value.length == sizeof(OCINumber) ? "decimal " + std::string(text, length) : "decimal of a bad size";
         }
-        case Kind::bytes: return "bytes " + std::to_string(value.length);
+        case Kind::bytes: return "bytes " + Digits(value.Text());
         case Kind::timestamp: {
             char text[date::kMaxEngineText];
             return "time " + std::string(text, date::ToEngineText(value.Timestamp(), text));

@@ -137,13 +137,16 @@ TEST_F(Postgres, ServerThatGoesAway) {
         {"array", [&] { return insert->ExecuteArray(many, {.first = 0, .last = 20}, outcome); }},
         {"open", [&] { return query->Open(one, {}); }},
         {"begin", [&] { return connection_->Begin(TransactionMode::serializable); }},
+        {"start", [&] { return connection_->Begin(TransactionMode::read_write); }},
+        {"keeps", [&] { return connection_->KeepsPrepared({.format = 1}, flag); }},
         {"mark", [&] { return connection_->SetMark(); }},
         {"commit", [&] { return connection_->Commit(); }},
         {"rollback", [&] { return connection_->Rollback(); }},
         {"prepare", [&] { return connection_->Prepare({.format = 1}, flag); }}};
     for (const auto& [name, call] : calls) {
         insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
-        MUST(Execute(*insert, many, {.first = 0, .last = 20}), Answer(connection_->Rollback()));
+        MUST(Execute(*insert, many, {.first = 0, .last = 20}), Answer(connection_->Rollback()),
+             Answer(connection_->KeepsPrepared({.format = 1}, flag)));
         query = Opened("select n from t");
         const bool in_transaction = name[0] == 'c' || name[0] == 'r' || name[0] == 'p';
         if (in_transaction) { ASSERT_EQ(Run("delete from t where n = 1"), 0); }
@@ -170,10 +173,12 @@ TEST_F(Postgres, ServerThatGoesAway) {
 
 // What fails then is told where they are fetched.
 TEST_F(Postgres, RowsThatAreReadAhead) {
-    const auto query = Opened("select * from (values (1), (2), ('NaN'::numeric), (4)) v");
-    EXPECT_EQ(Fetched(*query, 1), "1;");
-    EXPECT_EQ(Query("select 7"), "7;");
-    EXPECT_EQ(Rest(*query), "2;error 1722");
+    for (const bool scrollable : {false, true}) {
+        const auto query = Opened("select * from (values (1), (2), ('NaN'::numeric), (4)) v", {.scrollable = scrollable});
+        EXPECT_EQ(Fetched(*query, 1), "1;");
+        EXPECT_EQ(Query("select 7"), "7;");
+        EXPECT_EQ(Rest(*query), "2;error 1722") << scrollable;
+    }
     std::uint64_t rows = 0;
     Written row;
     bool found = false;
@@ -300,14 +305,23 @@ TEST_F(Postgres, ValuesAtTheirLimits) {
         {"'9999-12-31'::date", "time 9999-12-31 00:00:00"}, {"'10000-01-01'::date", "error 1841"},
         {"'4713-12-31 BC'::timestamp", "error 1841"}, {"'4712-01-01 BC'::timestamp", "time -4712-01-01 00:00:00"},
         {"'0001-12-31 23:59:59.999999 BC'::timestamp", "time -0001-12-31 23:59:59.999999"},
-        {"'0044-03-15 12:00:00+00 BC'::timestamptz", "time -0044-03-15 12:00:00 +00:00"}};
+        {"'0044-03-15 12:00:00+00 BC'::timestamptz", "time -0044-03-15 12:00:00 +00:00"},
+        {"'9999-12-31 23:59:59.999999'::timestamp", "time 9999-12-31 23:59:59.999999"},
+        {"'\\x'::bytea", "null"}, {"'\\x0aff'::bytea", "bytes 0aff"}, {"''::text", "null"}, {"true", "1"}, {"false", "0"},
+        {"'x'::\"char\"", "x"}, {"'n'::name", "n"}, {"(-5)::int2", "-5"}, {"-9223372036854775808", "-9223372036854775808"},
+        {"4294967295::oid", "4294967295"}, {"'[1, 2]'::json", "[1, 2]"}, {"'<a/>'::xml", "<a/>"}, {"1.5::real", "real 1.5"},
+        {"'c'::char(3)", "c  "}, {"'2024-02-29'::date", "time 2024-02-29 00:00:00"}, {"interval '1-2'", "+01-02"},
+        {"interval '-1-2'", "-01-02"}, {"interval '0'", "+00 00:00:00.000000"}, {"interval '4 05:06:07.8'", "+04 05:06:07.800000"},
+        {"interval '-05:06:07.8'", "-00 05:06:07.800000"}, {"interval '106751991 days'", "+106751991 00:00:00.000000"},
+        {"interval '106751992 days'", "error 1873"}, {"interval '-106751992 days'", "error 1873"},
+        {"interval '1 month 1 day'", "error 1867"}};
     for (const auto& c : cases) {
         const std::string read = c.read, select = std::string("select ") + c.expression;
         const bool fails = read.starts_with("error");
         EXPECT_EQ(Query(select), fails ? read : read + ';') << select;
         EXPECT_EQ(Query(select + ", '::1'::inet"), fails ? read : read + ",::1;") << select;
     }
-    for (const char* number : {"0.0012", "0.00012", "-0.05", "1.5", "12.34", "100.05", "123456789.123456789", "1000000",
+    for (const char* number : {"0", "10", "100010", "0.0012", "0.00012", "-0.05", "1.5", "12.34", "100.05", "123456789.123456789", "1000000",
                                "12345678901234567890123456789012345678.91", "-0.5"})
         EXPECT_EQ(Query("select %1::text", {Decimal(Number(number))}), std::string(number) + ';') << "of the scale that it has";
     OCINumber infinite{};
@@ -332,6 +346,13 @@ TEST_F(Postgres, ValuesAtTheirLimits) {
         {"%1", leap, "time 2024-02-29 12:00:00;"}, {"%1 is null", leap, "0;"},
         {"pg_typeof(%1)::text", leap, "timestamp without time zone;"}};
     for (const auto& c : moments) EXPECT_EQ(Query(std::string("select ") + c.expression, {Moment(c.value)}), c.text) << c.expression;
+    const struct { const char* expression; const char* bound; const char* text; } texts[] = {
+        {"%1::timestamp", "29-FEB-24", "2024-02-29 00:00:00;"}, {"%1::timestamp", "29-FEB-24 01.02.03.5 PM", "2024-02-29 13:02:03.5;"},
+        {"%1::timestamp", "2024-02-29 13:02:03", "2024-02-29 13:02:03;"}, {"%1::timestamp", "29-FEB-24 x", "error 1830"},
+        {"%1::interval", "1-2", "1-2;"}, {"%1::interval", "-4 05:06:07.8", "-4 5:06:07.8;"}, {"%1::interval", "7", "error 1867"},
+        {"%1::interval", "7 days", "7 0:00:00;"}, {"%1::bytea", "0aFF", "\\x0aff;"}};
+    for (const auto& c : texts) EXPECT_EQ(Query("select (" + std::string(c.expression) + ")::text", {Text(c.bound)}), c.text) << c.bound;
+    EXPECT_EQ(Query("select %1::pg_catalog.date::text", {Moment(leap)}), "2024-02-29;");
     const struct { date::DateTime value; bool is_date; const char* read; std::uint16_t type; } literals[] = {
         {leap, true, "time 2024-02-29 12:00:00;", SQLT_DAT}, {leap, false, "time 2024-02-29 12:00:00;", SQLT_TIMESTAMP},
         {zoned, false, "time 2024-02-29 06:30:00 +00:00;", SQLT_TIMESTAMP_TZ}};
@@ -373,7 +394,8 @@ TEST_F(Postgres, SavepointsAreKnownByTheirNames) {
     }
     engine::ObjectDescription object;
     std::string schema = "\xFF";
-    EXPECT_EQ(Answer(connection_->Describe("\xFF", engine::ObjectKind::any, object)), 911);
+    for (const auto kind : {engine::ObjectKind::any, engine::ObjectKind::schema, engine::ObjectKind::database})
+        EXPECT_EQ(Answer(connection_->Describe("\xFF", kind, object)), 911);
     EXPECT_EQ(Answer(connection_->UseSchema(schema)), 911);
     EXPECT_EQ(Query("select n from t"), "3;") << "the transaction goes on";
 }
@@ -407,14 +429,16 @@ TEST_F(Postgres, LongArraysAreOneStatement) {
         Rows rows;
         rows.rows.assign(20, c.values);
         const auto insert = Prepared(c.sql, c.values);
-        EXPECT_EQ(Executed(*insert, rows, {.first = 0, .last = 20}).affected, 20u) << c.sql;
-        EXPECT_EQ(Query("select count(*) from s"), c.statements) << c.sql;
+        for (int run = 0; run < 2; ++run) EXPECT_EQ(Executed(*insert, rows, {.first = 0, .last = 20}).affected, 20u) << c.sql;
+        EXPECT_EQ(Query("select count(*) / 2 from s"), c.statements) << c.sql;
         ASSERT_EQ(Run("deallocate all"), 0);                           // the engine's own, too: they are made anew
         EXPECT_EQ(Execute(*insert, rows, {.first = 0, .last = 20}), 0) << c.sql;
-        EXPECT_EQ(Query("select count(*) from t"), "40;") << c.sql;
+        EXPECT_EQ(Query("select count(*) from t"), "60;") << c.sql;
         ASSERT_EQ(Answer(connection_->Rollback()), 0);
     }
     Rows one;
+    const auto truncate = Prepared("truncate t, s");
+    MUST(Run("deallocate all"), Execute(*truncate, one));
     EXPECT_TRUE(Executed(*Prepared("INSERT INTO T VALUES (1)"), one).last_row);
 }
 
@@ -434,7 +458,7 @@ TEST_F(Postgres, MeaningsOfTheSchema) {
         // Types that are known by their texts alone, and others beside them.
         {"'10.1.2.3'::inet", "10.1.2.3"}, {"'{1,2}'::int[], n", "{1,2},decimal .5"},
         {"'A0EEBC99-9C0B-4EF8-BB6D-6BB9BD380A11'::uuid, d", "a0eebc99-9c0b-4ef8-bb6d-6bb9bd380a11,time 2024-01-31 10:00:00"},
-        {"null::inet, '\\x0aff'::bytea, true, 2.5::float8, ctid", "null,bytes 2,1,real 2.5,row 00000000000000000001"}};
+        {"null::inet, '\\x0aff'::bytea, true, 2.5::float8, ctid", "null,bytes 0aff,1,real 2.5,row 00000000000000000001"}};
     for (const auto& c : cases) {
         const std::string answer = Query(std::string("select ") + c.expression + " from t");
         EXPECT_EQ(answer, answer.starts_with("error") ? c.value : std::string(c.value) + ';') << c.expression;
@@ -447,7 +471,28 @@ TEST_F(Postgres, MeaningsOfTheSchema) {
               (std::vector<std::int64_t>{7, 3, -5, 1000}));
     EXPECT_EQ(Opened("select max(d) from t")->Columns()[0].type, SQLT_DAT);
     EXPECT_EQ(Opened("select d + 1 from t")->Columns()[0].type, SQLT_DAT);
-    EXPECT_EQ(Told(Opened("select '10.1.2.3'::inet as i from t")->Columns()[0]), "I type 1 size 0 precision 0 scale 0");
+}
+
+TEST_F(Postgres, ColumnsAreToldByTheirTypes) {
+    const struct { std::vector<const char*> types; const char* told; } cases[] = {
+        {{"bool"}, "2 size 22 precision 1 scale 0"}, {{"int2"}, "2 size 22 precision 5 scale 0"},
+        {{"int4", "oid"}, "2 size 22 precision 10 scale 0"}, {{"int8"}, "2 size 22 precision 19 scale 0"},
+        {{"numeric"}, "2 size 22 precision 0 scale -127"}, {{"numeric(12,2)"}, "2 size 22 precision 12 scale 2"},
+        {{"numeric(5,-2)"}, "2 size 22 precision 5 scale -2"}, {{"numeric(300,200)"}, "2 size 22 precision 255 scale 127"},
+        {{"float4"}, "100 size 4 precision 0 scale 0"}, {{"float8"}, "101 size 8 precision 0 scale 0"},
+        {{"text", "varchar", "json", "xml", "inet", "interval"}, "1 size 0 precision 0 scale 0"},
+        {{"\"char\""}, "1 size 1 precision 0 scale 0"}, {{"name"}, "1 size 64 precision 0 scale 0"},
+        {{"varchar(3)"}, "1 size 12 precision 0 scale 0"}, {{"char(3)"}, "96 size 12 precision 0 scale 0"},
+        {{"bytea"}, "23 size 0 precision 0 scale 0"}, {{"refcursor"}, "116 size 8 precision 0 scale 0"},
+        {{"date", "pg_catalog.date", "timestamp(0)"}, "12 size 7 precision 0 scale 0"}, {{"timestamp"}, "187 size 11 precision 0 scale 6"},
+        {{"timestamp(3)"}, "187 size 11 precision 0 scale 3"}, {{"timestamptz"}, "188 size 13 precision 0 scale 6"},
+        {{"timestamptz(0)"}, "188 size 13 precision 0 scale 0"},
+        {{"interval year", "interval month", "interval year to month"}, "189 size 5 precision 9 scale 0"},
+        {{"interval day", "interval second"}, "190 size 11 precision 9 scale 6"},
+        {{"interval day to second(3)"}, "190 size 11 precision 9 scale 3"}};
+    for (const auto& c : cases)
+        for (const std::string type : c.types)
+            EXPECT_EQ(Told(Opened("select null::" + type + " as c")->Columns()[0]), std::string("C type ") + c.told) << type;
 }
 
 }  // namespace

@@ -33,7 +33,7 @@ TEST(RowStore, KeepsEveryKindOfValue) {
         row = {};
     }
     EXPECT_EQ(At(store, 0, 10),
-              "null;-1;real 0.5;text;bytes 0;decimal -1.5;time -4712-01-01 00:00:00;row 01020000000000000000;kind 7 loc;kind 9 c;");
+              "null;-1;real 0.5;text;bytes ;decimal -1.5;time -4712-01-01 00:00:00;row 01020000000000000000;kind 7 loc;kind 9 c;");
     store.Clear();
     EXPECT_EQ(store.Size(), 0u);
 }

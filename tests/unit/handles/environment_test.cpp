@@ -3,6 +3,7 @@
 
 #include "describe/describe_handle.h"
 #include "handles/attributes.h"
+#include "handles/character_set.h"
 #include "handles/environment.h"
 #include "handles/error_handle.h"
 #include "oci.h"
@@ -81,6 +82,29 @@ TEST(ErrorLists, KeepWhatIsAdded) {
     const int numbers[] = {1, 942, 1403};
     for (std::size_t at = 1; at <= 3; ++at) EXPECT_EQ(other.At(at)->number, numbers[at - 1]);
     EXPECT_FALSE(other.At(0) || other.At(4));
+}
+
+// A length beyond a terminated text does no harm, nor does one within it.
+TEST(TextIn, EndsAtAZeroOrItsLength) {
+    const struct { std::uint32_t mode; std::string_view text; const char* read; } cases[] = {
+        {OCI_DEFAULT, {"ab\0c", 4}, "ab"}, {OCI_DEFAULT, "ab\1c", "ab\1c"}, {OCI_DEFAULT, {"\0a", 2}, ""},
+        {OCI_UTF16, {"a\0b\0\0\0c\0", 8}, "ab"}, {OCI_UTF16, {"\0\1a\0", 4}, "\xC4\x80""a"},
+        {OCI_UTF16, {"\0\0a\0", 4}, ""}, {OCI_UTF16, {"a\0b\0", 4}, "ab"}};
+    for (const auto& c : cases) {
+        Environment* const environment = Environment::Open(c.mode, Environment::SetsOf(c.mode), {}, 0);
+        EXPECT_EQ(TextIn(*environment, c.text.data(), c.text.size()).View(), c.read);
+        Destroy(environment);
+    }
+}
+
+TEST(CharacterSets, NoPairIsTorn) {
+    const std::size_t whole[] = {0, 0, 2, 2, 2, 2, 6, 6, 8, 8};
+    for (const std::uint16_t id : {1000, 2000}) {
+        std::string text;
+        const CharacterSet& set = *charset::Find(id);
+        EXPECT_TRUE(charset::FromUtf8(set, "\xC3\xA4\xF0\x9F\x98\x80z", text));    // of 2, 4 and 2 bytes
+        for (std::size_t room = 0; room < std::size(whole); ++room) EXPECT_EQ(charset::Whole(set, text, room), whole[room]) << room;
+    }
 }
 
 TEST(TextToBuffer, CutsBetweenCharacters) {

@@ -72,10 +72,6 @@ TEST(Utf, NoCharacterIsTorn) {
     const std::string utf8 = "\xC3\xA4\xF0\x9F\x98\x80z";  // of 2, 4 and 1 bytes
     const size_t whole8[] = {0, 0, 2, 2, 2, 2, 6, 7, 7};
     for (size_t room = 0; room < std::size(whole8); ++room) EXPECT_EQ(utf::WholeUtf8(utf8, room), whole8[room]) << room;
-    const std::string utf16 = Units(u"\u00E4\U0001F600z");  // of 2, 4 and 2 bytes
-    const size_t whole16[] = {0, 0, 2, 2, 2, 2, 6, 6, 8, 8};
-    for (size_t room = 0; room < std::size(whole16); ++room)
-        EXPECT_EQ(utf::WholeUtf16(utf16, room), whole16[room]) << room;
 }
 
 }  // namespace
