@@ -17,14 +17,14 @@ bool IsWordCharacter(char c) {
 // The longer of two that begin alike stands first.
 constexpr std::string_view kOperators[] = {"->>", "->", "<=", ">=", "<>", "!=", "==", "||", "<<", ">>"};
 
-// What stands between quotes, of which a doubled one is one. Brackets cannot be doubled.
+// What stands between quotes, of which a doubled one is one. There are none within brackets.
 std::string Unquoted(std::string_view piece) {
-    const char quote = piece.front();
+    const char quote = piece.back();
     const std::string_view inside = piece.substr(1, piece.size() - 2);
     std::string plain;
     for (std::size_t at = 0; at < inside.size(); ++at) {
         plain.push_back(inside[at]);
-        if (quote != '[' && inside[at] == quote && at + 1 < inside.size() && inside[at + 1] == quote) ++at;
+        if (inside[at] == quote) ++at;
     }
     return plain;
 }
@@ -127,7 +127,7 @@ bool ReadObjectName(std::string_view text, ObjectName& read) {
 }
 
 std::string PlainName(std::string_view piece) {
-    const bool quoted = piece.size() >= 2 && (piece[0] == '"' || piece[0] == '`' || piece[0] == '[');
+    const bool quoted = piece.size() >= 2 && (piece[0] == '"' || piece[0] == '`' || piece[0] == '[' || piece[0] == '\'');
     return quoted ? Unquoted(piece) : std::string(piece);
 }
 

@@ -38,11 +38,10 @@ public:
     }
 
     EngineText Result() {
-        for (std::size_t index = 0; tokens_[index].kind != TokenKind::end;) {
+        for (std::size_t index = 0;; index = Visit(index)) {
             if (index == default_end_) Insert(tokens_[index - 1].End(), ")");
-            index = Visit(index);
+            if (tokens_[index].kind == TokenKind::end) break;
         }
-        if (default_end_ + 1 == tokens_.size()) Insert(tokens_[default_end_ - 1].End(), ")");
         Copy(step_.end);
         return std::move(result_);
     }
@@ -164,7 +163,6 @@ private:
         } else if (token.Is("truncate") && index == 0 && At(tokens_, 1).Is("table") &&
                    !dialect_.truncate_table.empty()) {
             Replace(token, tokens_[1].End(), dialect_.truncate_table);
-            return index + 2;
         } else if (token.Is("for") && step_.locks_rows && dialect_.cuts_for_update && open_.empty() &&
                    At(tokens_, index + 1).Is("update")) {
             return Drop(index, step_.end);
@@ -244,8 +242,8 @@ private:
         for (; tokens_[index].kind != TokenKind::end; ++index) {
             const Token& token = tokens_[index];
             if (token.Is(")") && --depth < 0) break;
-            if (depth > 0 && token.kind == TokenKind::number) arguments.append(", ").append(token.text);
-            if (depth > 0 && token.Is("*")) arguments.append(", 38");
+            if (token.kind == TokenKind::number) arguments.append(", ").append(token.text);
+            if (token.Is("*")) arguments.append(", 38");
             if (token.Is("(")) ++depth;
         }
         Replace(tokens_[as], tokens_[index].begin, arguments);
@@ -412,7 +410,7 @@ private:
                                         [&](const auto& spelling) { return tokens_[index].Is(spelling.written); });
         if (found == list.end() || defines_code_) return nullptr;
         if (is_call) return Previous(index).Is(".") ? nullptr : &*found;
-        if (Previous(index).Is(".") || Previous(index).Is("as") || next.Is(".") || next.Is("(")) return nullptr;
+        if (Previous(index).Is(".") || Previous(index).Is("as") || next.Is(".")) return nullptr;
         return &*found;
     }
 

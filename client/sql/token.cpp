@@ -53,7 +53,7 @@ Token Tokenizer::Next() {
         const std::size_t end = WordEnd(at_);
         const std::string_view word = text_.substr(at_, end - at_);
         const bool is_q = EqualsLower(word, "q") || EqualsLower(word, "nq");
-        if (is_q && end < text_.size() && text_[end] == '\'') return QLiteral(end);
+        if (is_q && Peek(word.size()) == '\'') return QLiteral(end);
         return Take(TokenKind::word, end);
     }
     if (IsDigit(c) || (c == '.' && IsDigit(Peek(1)))) return Number();
@@ -114,10 +114,9 @@ Token Tokenizer::QLiteral(std::size_t quote) {
 Token Tokenizer::Number() {
     std::size_t end = at_;
     while (end < text_.size() && (IsWordPart(text_[end]) || text_[end] == '.')) {
-        const bool exponent = Lower(text_[end]) == 'e';
-        ++end;
-        const bool sign = end < text_.size() && (text_[end] == '+' || text_[end] == '-');
-        if (exponent && sign && end + 1 < text_.size() && IsDigit(text_[end + 1])) ++end;
+        const bool exponent = Lower(text_[end++]) == 'e';
+        const char sign = Peek(end - at_);
+        if (exponent && (sign == '+' || sign == '-') && IsDigit(Peek(end - at_ + 1))) ++end;
     }
     return Take(TokenKind::number, end);
 }

@@ -21,7 +21,7 @@ void MarkOperands(const std::vector<Token>& tokens, std::size_t index, std::vect
     };
     if (IsComparison(At(tokens, index + 1))) mark(index + 2);
     const std::size_t first = index >= 2 && tokens[index - 1].Is(".") ? index - 2 : index;    // of table.rowid
-    if (first >= 2 && IsComparison(tokens[first - 1])) mark(first - 2);
+    if (IsComparison(At(tokens, first - 1))) mark(first - 2);
     if (!At(tokens, index + 1).Is("in") || !At(tokens, index + 2).Is("(")) return;
     for (std::size_t at = index + 3; IsOperand(At(tokens, at)) || At(tokens, at).Is(","); ++at) mark(at);
 }

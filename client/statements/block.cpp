@@ -145,7 +145,7 @@ Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
 }
 
 Status Statement::Savepoint(Compiled& compiled, const sql::Step& step, ub4 row, Stretch& stretch) {
-    SavepointStep read = ReadSavepoint(std::string_view(text_.Text()).substr(step.begin, step.end - step.begin));
+    SavepointStep read = ReadSavepoint(std::string_view(text_.Text()).substr(step.begin));
     stretch.Reserve();
     Status status = Change(compiled, step, row, 0);
     if (status.Ok()) stretch.Note(std::move(read));

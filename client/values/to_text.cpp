@@ -11,6 +11,7 @@
 #include "handles/errors.h"
 #include "number/number.h"
 #include "oci.h"
+#include "platform/hexadecimal.h"
 #include "platform/utf.h"
 #include "values/lobs.h"
 #include "values/out_rows.h"
@@ -70,7 +71,7 @@ int OtherRealText(double value, Workspace& workspace, View& text) {
     const double magnitude = std::fabs(value);
     if (magnitude < 1e-6 || magnitude >= 1e15) {
         OCINumber number;
-        if (const int error = number::FromDouble(value, &number)) return error;
+        if (const int error = number::FromDouble(value, &number)) return AsConversionError(error);
         return NumberText(number, workspace, text);
     }
     char* begin = workspace.small.data();
@@ -94,17 +95,11 @@ int SingleRealText(const Datum& datum, Workspace& workspace, View& text) {
     return BinaryRealText(single, workspace, text);
 }
 
-// Digits from the first that is not 0.
-std::ptrdiff_t SignificantDigits(View text) {
-    text.remove_prefix(std::min(text.find_first_of("123456789"), text.size()));
-    return std::count_if(text.begin(), text.end(), [](char c) { return c >= '0' && c <= '9'; });
-}
-
 // As a number that the engine has computed, or keeps, as a real.
 int RealText(const Datum& datum, Workspace& workspace, View& text) {
     if (AmountText(datum.real, workspace, text)) return 0;    // with no more digits than that
     if (const int error = OtherRealText(datum.real, workspace, text)) return error;
-    if (SignificantDigits(text) <= number::kRealDigits) return 0;
+    if (text.size() <= number::kRealDigits) return 0;
     OCINumber number;
     if (const int error = number::FromReal15(datum.real, &number)) return error;
     return NumberText(number, workspace, text);
@@ -163,7 +158,7 @@ std::size_t ShortDate(const date::DateTime& value, char* text) {
 int ModelText(const date::DateTime& value, Workspace& workspace, View& text) {
     std::size_t length = 0;
     char* begin = workspace.small.data();
-    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0 && value.month <= 12) {
+    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0) {
         text = {begin, ShortDate(value, begin)};
         return 0;
     }
@@ -188,13 +183,6 @@ int RowIdText(const Datum& datum, Workspace& workspace, View& text) {
 int NoText(const Datum&, Workspace&, View&) { return errors::kInconsistentTypes; }
 
 // ---- How values become bytes
-
-int HexDigit(char c) {
-    if (c >= '0' && c <= '9') return c - '0';
-    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-    return -1;
-}
 
 // Pairs of hexadecimal digits; an odd count has a zero before it.
 int BytesOfHex(const Datum& datum, Workspace& workspace, View& bytes) {

@@ -84,10 +84,10 @@ private:
         const std::size_t type = definition.first + 1;
         const std::size_t at = FindWord(type, {"default"});
         std::size_t literal = at + 1;
-        if (at >= definition.last || literal >= definition.last) return {};
+        if (at >= definition.last) return {};
         const bool has_sign = Is(literal, "-") || Is(literal, "+");
         if (has_sign) ++literal;
-        const bool is_number = literal < definition.last && IsNumber(pieces_[literal]);
+        const bool is_number = IsNumber(pieces_[literal]);
         if (!is_number && !(IsLiteral(pieces_[literal]) && !has_sign)) return {};
         std::size_t type_end = type;
         while (type_end < at && (!IsKeyword(pieces_[type_end]) && !Is(type_end, "constraint"))) ++type_end;

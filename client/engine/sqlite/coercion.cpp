@@ -9,9 +9,11 @@
 #include "date/format.h"
 #include "engine/sqlite/characters.h"
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/errors.h"
 #include "engine/sqlite/interval_text.h"
 #include "handles/errors.h"
 #include "number/number.h"
+#include "platform/hexadecimal.h"
 
 namespace engine::sqlite {
 namespace {
@@ -65,21 +67,16 @@ bool IsPlainReal(double value, int precision, int scale) {
     return digits > kMostPower || std::fabs(value) < static_cast<double>(kPowersOfTen[digits]);
 }
 
+// The number is valid, and the digits are those of a declaration: none of this can fail.
 bool ExceedsPrecision(const OCINumber& number, int digits) {
-    OCINumber one;
     OCINumber limit;
     OCINumber size;
-    int compared = -1;
-    number::FromInt64(1, &one);
-    if (number::Shift(one, digits, &limit) != 0 || number::Abs(number, &size) != 0) return false;
-    return number::Compare(size, limit, &compared) == 0 && compared >= 0;
-}
-
-int HexDigit(char c) {
-    if (c >= '0' && c <= '9') return c - '0';
-    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-    return -1;
+    int compared = 0;
+    number::FromInt64(1, &limit);
+    (void)number::Shift(limit, digits, &limit);
+    (void)number::Abs(number, &size);
+    (void)number::Compare(size, limit, &compared);
+    return compared >= 0;
 }
 
 // The default model of the type, else the form in which dates are kept.
@@ -134,7 +131,7 @@ Status Coercion::Apply(Datum& value) {
 }
 
 Status Coercion::Refuse(int number) const {
-    return Error(number, column_.name.empty() ? std::string() : "column " + column_.name);
+    return Error(SqlNumber(number), column_.name.empty() ? std::string() : "column " + column_.name);
 }
 
 Status Coercion::ApplyNumber(Datum& value) {
@@ -161,7 +158,6 @@ Status Coercion::ApplyDigits(Datum& value) {
     if (value.kind == Kind::decimal) return ApplyDecimal(*static_cast<const OCINumber*>(value.data), value);
     if (value.kind == Kind::integer) {
         if (!limited || (scale >= 0 && Fits(value.integer, precision - scale))) return {};
-        if (scale >= 0) return Refuse(errors::kAbovePrecision);
         number::FromInt64(value.integer, &number_);
         return ApplyDecimal(number_, value);
     }
@@ -177,8 +173,7 @@ Status Coercion::ApplyBinary(Datum& value) {
     if (value.kind == Kind::integer) {
         value.real = static_cast<double>(value.integer);
     } else if (value.kind == Kind::decimal) {
-        const int failure = number::ToDouble(*static_cast<const OCINumber*>(value.data), &value.real);
-        if (failure != 0) return Refuse(errors::kNumericOverflow);
+        (void)number::ToDouble(*static_cast<const OCINumber*>(value.data), &value.real);    // which holds more
     }
     value.kind = Kind::real;
     if (column_.type == SQLT_IBDOUBLE) return {};

@@ -27,7 +27,7 @@ struct TypeRow {
 };
 
 constexpr std::int8_t kFloating = -127;
-constexpr int kMostCharacters = 1 << 29;
+constexpr long kLargestSize = 1L << 29;    // of which four bytes each can be told
 constexpr std::uint32_t kDateSize = 7;
 constexpr std::uint32_t kTimestampSize = 11;
 constexpr std::uint32_t kZonedTimestampSize = 13;
@@ -129,7 +129,7 @@ std::size_t Numbers(const std::string& normal, std::array<int, 2>& numbers) {
         char* end = nullptr;
         const long number = std::strtol(at, &end, 10);
         if (end == at) break;
-        numbers[count] = static_cast<int>(std::clamp(number, -1000000000L, 1000000000L));
+        numbers[count] = static_cast<int>(std::clamp(number, -kLargestSize, kLargestSize));
         at = *end == ',' ? end + 1 : end;
     }
     return count;
@@ -150,9 +150,7 @@ void Apply(Measure measure, const std::string& normal, Column& column) {
     switch (measure) {
         case Measure::none: break;
         case Measure::size: column.size = static_cast<std::uint32_t>(std::max(numbers[0], 0)); break;
-        case Measure::characters:
-            CountCharacters(static_cast<std::uint32_t>(std::clamp(numbers[0], 0, kMostCharacters)), column);
-            break;
+        case Measure::characters: CountCharacters(static_cast<std::uint32_t>(std::max(numbers[0], 0)), column); break;
         case Measure::digits:
             column.precision = static_cast<std::uint8_t>(std::clamp(numbers[0], 0, 38));
             column.scale = static_cast<std::int8_t>(count > 1 ? std::clamp(numbers[1], -84, 127) : 0);

@@ -106,7 +106,7 @@ private:
     void CompareEach(Span subject, const std::vector<Span>& others) {
         for (const Span other : others) Compare(subject, other);
         const Span bare = operands_.Bare(subject);
-        if (operands_.IsValue(bare)) CheckTypes(others, IsLiteral(At(bare.first)) && PlainText(At(bare.first)).ends_with(' '));
+        if (operands_.IsValue(bare)) CheckTypes(others, PlainText(At(bare.first)).ends_with(' '));
     }
 
     // A value is read in one way only: it cannot be compared with a date or a raw, or with blanks at its end with fixed

@@ -6,22 +6,12 @@
 #include "engine/sqlite/function_values.h"
 #include "handles/errors.h"
 #include "number/format.h"
+#include "platform/hexadecimal.h"
 
 namespace engine::sqlite {
 namespace {
 
 constexpr std::size_t kLongestModelText = 512;    // models of numbers have 64 elements, those of dates 22 names
-
-// What the calls for numbers answer, as SQL tells it.
-int SqlNumber(number::Errno failure) {
-    switch (failure) {
-        case errors::kBadNumberFormat: return errors::kBadNumberModel;
-        case errors::kBadNumberText:
-        case errors::kBadNumber: return errors::kInvalidNumber;
-        case errors::kNumberOverflow: return errors::kNumericOverflow;
-        default: return failure;
-    }
-}
 
 void ReturnText(sqlite3_context* context, std::string_view text) {
     sqlite3_result_text64(context, text.data(), text.size(), SQLITE_TRANSIENT, SQLITE_UTF8);
@@ -58,7 +48,7 @@ void ToChar(sqlite3_context* context, int count, Arguments arguments) {
     } else {
         OCINumber number;
         failure = ReadNumber(arguments[0], number);
-        if (failure == 0) failure = SqlNumber(NumberText(number, model, text, &length));
+        if (failure == 0) failure = NumberText(number, model, text, &length);
     }
     if (failure != 0) return Refuse(context, failure);
     ReturnText(context, {text.data(), length});
@@ -91,16 +81,10 @@ void TextToNumber(sqlite3_context* context, int count, Arguments arguments) {
     if (count == 1 || IsNumber(arguments[0])) {
         failure = ReadNumber(arguments[0], number);
     } else {
-        failure = SqlNumber(number::FromText(TextOf(arguments[0]), TextOf(arguments[1]), number::Nls(), &number));
+        failure = number::FromText(TextOf(arguments[0]), TextOf(arguments[1]), number::Nls(), &number);
     }
     if (failure != 0) return Refuse(context, failure);
     ReturnNumber(context, number);
-}
-
-int HexadecimalValue(char c) {
-    if (c >= '0' && c <= '9') return c - '0';
-    const char small = static_cast<char>(c | 0x20);
-    return small >= 'a' && small <= 'f' ? small - 'a' + 10 : -1;
 }
 
 // hextoraw(digits); before an odd number of them stands a 0.
@@ -113,7 +97,7 @@ void HexToRaw(sqlite3_context* context, int count, Arguments arguments) {
     bool second = digits.Text().size() % 2 != 0;
     int high = 0;
     for (const char c : digits.Text()) {
-        const int value = HexadecimalValue(c);
+        const int value = HexDigit(c);
         if (value < 0) return Refuse(context, errors::kBadHexadecimal);
         if (second) bytes.Append(static_cast<char>(high * 16 + value));
         high = value;

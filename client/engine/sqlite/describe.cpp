@@ -185,8 +185,7 @@ Verb VerbOf(std::string_view sql) {
         if (IsWord(piece, "insert") || IsWord(piece, "replace")) return Verb::insert;
         if (IsWord(piece, "update")) return Verb::update;
         if (IsWord(piece, "delete")) return Verb::remove;
-        if (!with && !IsWord(piece, "with")) return Verb::other;
-        if (IsWord(piece, "select")) return Verb::other;
+        if (IsWord(piece, "select") || (!with && !IsWord(piece, "with"))) break;
         with = true;
     }
     return Verb::other;

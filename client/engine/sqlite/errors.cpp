@@ -96,11 +96,9 @@ int CountMismatch(std::string_view message) {
     int columns = 0;
     int values = 0;
     const std::size_t has = message.rfind(" has ");
-    if (has != std::string_view::npos &&
-        std::sscanf(message.data() + has, " has %d columns but %d values", &columns, &values) == 2) {
-        return values < columns ? errors::kTooFewValues : errors::kTooManyValues;
-    }
-    const bool told = std::sscanf(message.data(), "%d values for %d columns", &values, &columns) == 2;
+    const bool told = (has != std::string_view::npos &&
+                       std::sscanf(message.data() + has, " has %d columns but %d values", &columns, &values) == 2) ||
+                      std::sscanf(message.data(), "%d values for %d columns", &values, &columns) == 2;
     return !told ? 0 : values < columns ? errors::kTooFewValues : errors::kTooManyValues;
 }
 
@@ -156,6 +154,17 @@ Status Failure(sqlite3* database, int code, Verb verb) noexcept {
     const int told = (extended & 0xFF) == (code & 0xFF) ? extended : code;
     const int number = MayNotGrow(told) ? errors::kNoRoom : NumberOf(told, verb, words);
     return Told(number, words);
+}
+
+int SqlNumber(int failure) noexcept {
+    switch (failure) {
+        case errors::kBadNumberFormat: return errors::kBadNumberModel;
+        case errors::kBadNumberText:
+        case errors::kBadNumber: return errors::kInvalidNumber;
+        case errors::kNumberUnderflow:
+        case errors::kNumberOverflow: return errors::kNumericOverflow;
+        default: return failure;
+    }
 }
 
 Status RolledBack(const Status& failure) noexcept try {

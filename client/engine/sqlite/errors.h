@@ -22,6 +22,9 @@ Status Failure(sqlite3* database, int code, Verb verb = Verb::other) noexcept;
 // A failure that has taken the transaction with it: the record says so, too, even where memory is short (1019 then).
 Status RolledBack(const Status& failure) noexcept;
 
+// What the calls for numbers answer, as SQL tells it; other numbers are as they are.
+int SqlNumber(int failure) noexcept;
+
 // The status of a result code that has no database behind it.
 Status Failure(int code, std::string_view words) noexcept;
 

@@ -25,7 +25,7 @@ void Refuse(sqlite3_context* context, const Status& status) {
     const std::string words = std::string(kErrorMark) + std::to_string(status.Number()) + ' ' + status.Detail();
     sqlite3_result_error(context, words.c_str(), static_cast<int>(words.size()));
 }
-void Refuse(sqlite3_context* context, int number) { Refuse(context, Error(number)); }
+void Refuse(sqlite3_context* context, int number) { Refuse(context, Error(SqlNumber(number))); }
 
 std::string_view Bytes(sqlite3_value* value) {
     const auto* bytes = static_cast<const char*>(sqlite3_value_blob(value));

@@ -76,7 +76,7 @@ template <bool padded, Unit unit>
 void ToText(sqlite3_context* context, int count, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
     const TextArgument value(arguments[0]);
-    if (value.Failure() != 0) return Refuse(context, errors::kInvalidNumber);
+    if (value.Failure() != 0) return Refuse(context, value.Failure());
     std::string text(value.Text());
     const int limit = count > 1 ? sqlite3_value_int(arguments[1]) : padded ? 1 : 0;
     if (limit > 0) {
@@ -128,15 +128,16 @@ void ToIntervalText(sqlite3_context* context, int, Arguments arguments) {
     sqlite3_result_text(context, written.data(), static_cast<int>(written.size()), SQLITE_TRANSIENT);
 }
 
-// The present moment in local time: as a date, or with fraction and zone.
-template <bool whole_seconds>
+enum class Moment : std::uint8_t { date, local, zoned };
+
+// The present moment in local time: as a date, with a fraction, or with the zone, too.
+template <Moment moment>
 void Now(sqlite3_context* context, int, Arguments) {
     date::DateTime now;
-    if (const int failure = date::Now(&now)) return Refuse(context, failure);
-    if (whole_seconds) {
-        now.nanosecond = 0;
-        now.has_zone = false;
-    }
+    int failure = date::Now(&now);
+    if (failure == 0 && moment == Moment::zoned) failure = date::SetZone({}, &now);
+    if (failure != 0) return Refuse(context, failure);
+    if (moment == Moment::date) now.nanosecond = 0;
     ReturnDate(context, now);
 }
 
@@ -201,8 +202,9 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_compare", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::compare>},
     {"nvl", 2, 2, SQLITE_DETERMINISTIC, Nvl, "", 1},
     {"nvl2", 3, 3, SQLITE_DETERMINISTIC, Nvl2, "", 2},
-    {"kelp_sysdate", 0, 0, 0, Now<true>, "date"},
-    {"kelp_systimestamp", 0, 0, 0, Now<false>, "timestamp_tz"},
+    {"kelp_sysdate", 0, 0, 0, Now<Moment::date>, "date"},
+    {"kelp_localtimestamp", 0, 0, 0, Now<Moment::local>, "timestamp"},
+    {"kelp_systimestamp", 0, 0, 0, Now<Moment::zoned>, "timestamp_tz"},
 };
 
 // What SQLite's own functions answer.

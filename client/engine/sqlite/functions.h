@@ -42,7 +42,7 @@ inline constexpr Dialect::Spelling kMoments[] = {
     {"current_date", "(kelp_sysdate())"},
     {"systimestamp", "(kelp_systimestamp())"},
     {"current_timestamp", "(kelp_systimestamp())"},
-    {"localtimestamp", "(kelp_systimestamp())"},
+    {"localtimestamp", "(kelp_localtimestamp())"},
 };
 
 Status AddFunctions(sqlite3* database);

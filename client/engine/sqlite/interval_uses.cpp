@@ -17,9 +17,9 @@ constexpr std::size_t kNone = static_cast<std::size_t>(-1);
 bool IsPlainName(std::string_view piece) { return IsName(piece) && !IsKeyword(piece); }
 
 // What may stand before an expression that is all of a condition's side, an item or an argument; and behind one.
-bool Begins(std::string_view piece) { return piece.empty() || piece == "(" || piece == "," || IsKeyword(piece); }
+bool Begins(std::string_view piece) { return piece == "(" || piece == "," || IsKeyword(piece); }
 bool Ends(std::string_view piece) {
-    if (piece.empty() || piece == ")" || piece == "," || piece == ";") return true;
+    if (piece.empty() || piece == ")" || piece == ",") return true;
     return IsName(piece) && !IsOneOf(piece, {"collate", "like", "glob", "match", "regexp", "escape", "over", "filter", "range"});
 }
 
@@ -113,7 +113,7 @@ private:
                                          (before == "," && IsOneOf(At(Clause(span.first)), {"select", "returning"})))) {
                 if (!Ends(after)) return false;
                 const std::size_t clause = Clause(span.first);
-                if (At(clause) == "(") return IsWord(before, "distinct") && IsWord(Before(clause), "count");
+                if (At(clause) == "(") return IsWord(Before(clause), "count");
                 const std::size_t open = Around(clause);
                 if (open == kNone || !IsScalar(open)) return InSelectList(span, clause, open, is_plain);
                 if (IsCompound(clause) || names_.Items(clause).size() != 1) return false;
@@ -143,7 +143,6 @@ private:
         if (!Ends(after)) return false;
         if (IsWord(before, "by")) return true;
         const std::size_t clause = before == "(" ? span.first - 1 : before == "," ? Clause(span.first) : kNone;
-        if (clause == kNone) return false;
         return IsWord(At(clause), "by") || (At(clause) == "(" && InList(span, clause)) ||
                (IsWord(At(clause), "values") && AsText(span));
     }
@@ -159,7 +158,7 @@ private:
 
     bool BehindComparison(Span span) {
         const Span other = operands_.Before(span.first - 1);
-        return other.Size() > 0 && (IsTarget(other) ? AsText(span) : Fits(other, span));
+        return IsTarget(other) ? AsText(span) : Fits(other, span);
     }
 
     // is null, not null, [not] in (...), [not] between ... and ...
@@ -250,17 +249,16 @@ private:
     [[nodiscard]] bool IsCompound(std::size_t clause) const { return Parts(clause).size() > 1; }
 
     bool InSelectList(Span span, std::size_t clause, std::size_t open, bool is_plain) {
-        if (open != kNone && Before(open) == "=") return AsText(span);
+        if (Before(open) == "=") return AsText(span);
         const std::vector<Names::Item> items = names_.Items(clause);
         const auto item = std::find_if(items.begin(), items.end(), [&](const Names::Item& candidate) {
-            return candidate.expression.first == span.first && candidate.expression.last == span.last;
+            return candidate.expression.last == span.last;
         });
         if (item == items.end()) return false;
         const bool shows = open == kNone;
         if (shows && Changes(clause)) return AsText(span);
         if (MakesTable()) return false;
-        if (shows && IsWord(At(0), "create") && !is_plain) return false;
-        if (!shows && !is_plain && !IsWord(Before(open), "exists")) return false;
+        if (!is_plain && (shows ? IsWord(At(0), "create") : !IsWord(Before(open), "exists"))) return false;
         const auto index = static_cast<std::size_t>(item - items.begin());
         if (IsWord(At(clause), "select") && IsCompound(clause) && !Agree(Parts(clause), index)) return false;
         const bool is_told = std::none_of(items.begin(), item, [](const Names::Item& other) { return other.is_all; });

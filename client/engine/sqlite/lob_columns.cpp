@@ -82,7 +82,7 @@ private:
         const std::size_t index = index_++;
         const bool behind = name + 1 < item.last;    // an alias, or more of an expression
         const bool alias = behind && (name + 2 == item.last ? IsName(pieces_[name + 1]) && !IsAnyOf(pieces_[name + 1], {"is", "isnull", "notnull"})
-                                                            : name + 3 == item.last && IsWord(pieces_[name + 1], "as"));
+                                                            : IsWord(pieces_[name + 1], "as"));
         if ((behind && !alias) || !IsName(pieces_[name]) || (qualified && !IsTable(pieces_[item.first]))) return;
         TableColumn column;
         if (!ReadColumn(database_, read_.table, pieces_[name], column) || !ObjectKindOf(column.column)) return;
@@ -91,16 +91,14 @@ private:
     }
     void RewriteAll(Span item) {
         std::string list;
-        bool any = false;
         for (const TableColumn& column : InsertableColumns(database_, read_.table)) {
             if (!list.empty()) list += ", ";
             const bool is_object = ObjectKindOf(column.column).has_value();
-            any |= is_object;
             list += is_object ? Number(column) : Name() + '.' + Quoted(column.name);
             if (is_object) Note(index_, column);
             ++index_;
         }
-        if (any) edits.push_back({Begin(item.first), End(item.last - 1), list, {}, true});
+        edits.push_back({Begin(item.first), End(item.last - 1), list, {}, true});
     }
     void Note(std::size_t index, const TableColumn& column) {
         items.push_back({index, store_.Column(read_.table.schema, read_.table.name, column.name, *ObjectKindOf(column.column))});

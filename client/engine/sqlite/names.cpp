@@ -14,6 +14,8 @@ namespace {
 // What is kept as something that it does not look like.
 bool IsMoment(const Column& column) { return IsDateType(column.type) || IsIntervalType(column.type); }
 
+bool IsSame(const std::string& left, const std::string& right) { return sqlite3_stricmp(left.c_str(), right.c_str()) == 0; }
+
 }  // namespace
 
 const TableColumn* Names::TypeOf(Span span) {
@@ -56,7 +58,7 @@ const TableColumn* Names::Resolve(Span name) {
 // any table, as behind what is not understood.
 Names::Found Names::FindName(std::string_view column, const std::string& qualifier, std::size_t scope) {
     const auto is_meant = [&](const Table& table) {
-        return qualifier.empty() || sqlite3_stricmp(table.name.c_str(), qualifier.c_str()) == 0;
+        return qualifier.empty() || IsSame(table.name, qualifier);
     };
     for (;; scope = parents_[scope]) {
         const auto in_scope = [&](const Table& table) { return table.scope == scope && is_meant(table); };
@@ -64,7 +66,7 @@ Names::Found Names::FindName(std::string_view column, const std::string& qualifi
         if (found.any || !status_.Ok()) return found;
         if (parents_[scope] == scope) break;
     }
-    return Agreed(column, [](const Table& table) { return !table.is_target && table.query == 0; });
+    return {};
 }
 
 // The column of that name in the tables meant, if they agree on its type. Dates and intervals are too easily taken
@@ -100,12 +102,13 @@ Names::Found Names::ColumnOf(const Table& table, std::string_view name) {
 
 // By the select list of a subquery, or the names that WITH gives to its columns.
 Names::Found Names::ColumnOfQuery(const Table& table, const std::string& name) {
-    const auto is_called = [&](std::string_view called) { return sqlite3_stricmp(PlainName(called).c_str(), name.c_str()) == 0; };
+    const auto is_called = [&](std::string_view called) { return IsSame(PlainName(called), name); };
     if (!table.names.empty()) {
         const auto named = std::find_if(table.names.begin(), table.names.end(), is_called);
-        std::vector<Found> columns;
+        std::vector<Listed> columns;
         const auto at = static_cast<std::size_t>(named - table.names.begin());
-        return named != table.names.end() && Expand(table.query, columns) && at < columns.size() ? columns[at] : Found();
+        if (named == table.names.end() || !ExpandQuery(table.query, columns) || at >= columns.size()) return {};
+        return {true, columns[at].column};
     }
     for (const Item& item : Items(table.query)) {
         if (item.is_all) {
@@ -118,24 +121,50 @@ Names::Found Names::ColumnOfQuery(const Table& table, const std::string& name) {
     return {};
 }
 
-// The columns of a query in their order. False where that is not known: joins may merge columns in "*".
-bool Names::Expand(std::size_t query, std::vector<Found>& columns) {
+// The columns of a table or subquery in their order. False where that is not known.
+bool Names::Expand(const Table& table, std::vector<Listed>& columns) {
+    if (table.query == 0) {
+        for (TableColumn& column : AllColumns(database_, table.table)) {
+            const TableColumn& kept = columns_.emplace_back(std::move(column));
+            columns.push_back({kept.name, &kept});
+        }
+        return true;
+    }
+    if (!ExpandQuery(table.query, columns)) return false;
+    for (std::size_t at = 0; at < std::min(table.names.size(), columns.size()); ++at)
+        columns[at].name = PlainName(table.names[at]);
+    return true;
+}
+
+bool Names::ExpandQuery(std::size_t query, std::vector<Listed>& columns) {
     if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(query), "select")) return false;
-    const bool merges = std::any_of(pieces_.begin(), pieces_.end(), [](auto piece) { return IsOneOf(piece, {"natural", "using"}); });
     bool told = true;
     ++depth_;
     for (const Item& item : Items(query)) {
-        if (!item.is_all) columns.push_back({true, TypeOf(item.expression)});
-        else told = told && (!merges || !item.qualifier.empty());
+        if (!item.is_all) {
+            columns.push_back({PlainName(item.name), TypeOf(item.expression)});
+            continue;
+        }
+        const std::size_t first = columns.size();
         for (const Table& table : tables_) {
-            const bool is_meant = item.qualifier.empty() || sqlite3_stricmp(table.name.c_str(), item.qualifier.c_str()) == 0;
-            if (!told || !item.is_all || !is_meant || table.scope != scopes_[query]) continue;
-            if (table.query != 0) told = Expand(table.query, columns);
-            else for (TableColumn& column : AllColumns(database_, table.table)) columns.push_back({true, &columns_.emplace_back(std::move(column))});
+            const bool is_all = item.qualifier.empty();
+            if (table.scope != scopes_[query] || !(is_all || IsSame(table.name, item.qualifier))) continue;
+            std::vector<Listed> of_table;
+            told = Expand(table, of_table) && told;
+            const std::vector<Listed> before(columns.begin() + static_cast<std::ptrdiff_t>(first), columns.end());
+            for (Listed& column : of_table)
+                if (!is_all || !IsMerged(table, column.name, before)) columns.push_back(std::move(column));
         }
     }
     --depth_;
     return told;
+}
+
+// Whether "*" shows the column where a table stands that was joined before.
+bool Names::IsMerged(const Table& table, const std::string& name, const std::vector<Listed>& before) {
+    const auto is_called = [&](const Listed& column) { return IsSame(column.name, name); };
+    if (table.is_natural) return std::any_of(before.begin(), before.end(), is_called);
+    return std::any_of(table.merged.begin(), table.merged.end(), [&](auto merged) { return IsSame(PlainName(merged), name); });
 }
 
 std::vector<Names::Item> Names::Items(std::size_t select) const {
@@ -165,7 +194,7 @@ Names::Item Names::ReadItem(Span span) const {
     } else if (span.Size() > 2 && IsWord(At(span.last - 2), "as")) {
         item.name = last;
         item.expression.last -= 2;
-    } else if (operands_.From(span.first).last + 1 == span.last && IsName(last)) {
+    } else if (operands_.From(span.first).last + 1 == span.last) {
         item.name = last;
         --item.expression.last;
     } else if (operands_.IsColumn(span)) {
@@ -200,12 +229,24 @@ void Names::ReadTables() {
             open.back() = enter(parents_.size());
         } else if (IsOneOf(At(at), {"conflict", "returning"}) && outside) {
             open.back() = 0;
+            if (IsWord(At(at), "conflict")) NoteExcluded();
         }
         scopes_[at] = open.back();
         if (IsWord(At(at), "into")) inserts = true;
         if (IsOneOf(At(at), {"from", "join", "into", "update"}))
             ReadList(IsWord(At(at + 1), "or") ? at + 3 : at + 1, open.back(), IsWord(At(at), "into"));
     }
+    for (Table& table : tables_)
+        if (table.query == 0) UseWith(table);    // which comes later
+}
+
+// Behind ON CONFLICT the row that was to be inserted goes by a name of its own.
+void Names::NoteExcluded() {
+    const auto target = std::find_if(tables_.begin(), tables_.end(), [](const Table& table) { return table.is_target; });
+    if (target == tables_.end()) return;
+    Table excluded = *target;
+    excluded.name = "excluded";
+    tables_.push_back(std::move(excluded));
 }
 
 // with NAME as (query), with NAME(a, b) as (query): the query opens at `open`.
@@ -232,6 +273,7 @@ void Names::ReadList(std::size_t at, std::size_t scope, bool is_target) {
         if (!is_query && (!IsName(At(at)) || IsKeyword(At(at)))) return;
         Table& table = tables_.emplace_back();
         table.scope = scope;
+        table.is_natural = IsNaturalJoin(at);
         table.is_target = is_target;
         if (is_query) {
             table.query = at + 1;
@@ -243,15 +285,24 @@ void Names::ReadList(std::size_t at, std::size_t scope, bool is_target) {
         }
         if (IsWord(At(at), "as")) ++at;
         if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
+        if (IsWord(At(at), "using"))
+            for (std::size_t name = at + 2; name < operands_.Partner(at + 1); name += 2) table.merged.push_back(At(name));
         if (At(at) != ",") return;
         ++at;
     }
 }
 
+// natural [left|right|full] [outer|inner] join HERE
+bool Names::IsNaturalJoin(std::size_t at) const {
+    if (!IsWord(At(at - 1), "join")) return false;
+    for (--at; IsOneOf(At(at - 1), {"left", "right", "full", "outer", "inner", "cross"}); --at) {}
+    return IsWord(At(at - 1), "natural");
+}
+
 // A name that WITH has given hides a table's.
 void Names::UseWith(Table& table) const {
     for (const With& with : withs_) {
-        if (sqlite3_stricmp(with.name.c_str(), table.name.c_str()) != 0) continue;
+        if (!table.table.schema.empty() || !IsSame(with.name, table.table.name)) continue;
         table.query = with.query;
         table.names = with.names;
     }
@@ -261,7 +312,7 @@ void Names::UseWith(Table& table) const {
 bool Names::HasIntervals(std::size_t select, const std::string& qualifier) {
     if (scopes_.empty()) ReadTables();
     for (const Table& table : tables_) {
-        const bool is_meant = qualifier.empty() || sqlite3_stricmp(table.name.c_str(), qualifier.c_str()) == 0;
+        const bool is_meant = qualifier.empty() || IsSame(table.name, qualifier);
         if (table.scope != scopes_[select] || !is_meant) continue;
         if (table.query == 0 ? TableHasIntervals(table.table) : QueryHasIntervals(table.query)) return true;
     }

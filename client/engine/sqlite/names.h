@@ -51,6 +51,8 @@ private:
         TableName table;
         std::size_t query = 0;                  // where a subquery begins; 0: a table
         std::vector<std::string_view> names;    // of a subquery's columns, where WITH tells them
+        bool is_natural = false;                // joined so, or USING these columns: "*" stands for one of each pair
+        std::vector<std::string_view> merged;
     };
     struct With {
         std::string name;
@@ -64,19 +66,29 @@ private:
         const TableColumn* column = nullptr;
     };
 
+    // A column of a query; not a table's where it is calculated.
+    struct Listed {
+        std::string name;
+        const TableColumn* column = nullptr;
+    };
+
     [[nodiscard]] std::string_view At(std::size_t index) const { return operands_.At(index); }
     Found FindName(std::string_view column, const std::string& qualifier, std::size_t scope);
     template <class Meant>
     Found Agreed(std::string_view name, Meant is_meant);
     Found ColumnOf(const Table& table, std::string_view name);
     Found ColumnOfQuery(const Table& table, const std::string& name);
-    bool Expand(std::size_t query, std::vector<Found>& columns);
+    bool Expand(const Table& table, std::vector<Listed>& columns);
+    bool ExpandQuery(std::size_t query, std::vector<Listed>& columns);
+    static bool IsMerged(const Table& table, const std::string& name, const std::vector<Listed>& before);
     [[nodiscard]] Item ReadItem(Span span) const;
     [[nodiscard]] bool TableHasIntervals(const TableName& table) const;
     bool QueryHasIntervals(std::size_t query);
     void ReadTables();
+    void NoteExcluded();
     void NoteWith(std::size_t open);
     void ReadList(std::size_t at, std::size_t scope, bool is_target);
+    [[nodiscard]] bool IsNaturalJoin(std::size_t at) const;
     void UseWith(Table& table) const;
 
     sqlite3* database_;

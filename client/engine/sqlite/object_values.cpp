@@ -84,9 +84,8 @@ Status ObjectValues::Take(std::span<Datum> values, bool may_fill) {
 }
 
 std::uint64_t ObjectValues::LengthOf(const Datum& value) const {
-    const auto found = std::find_if(waiting_.begin(), waiting_.end(),
-                                    [&](const Waiting& object) { return object.lob == value.data; });
-    return found == waiting_.end() ? 0 : found->length;
+    return std::find_if(waiting_.begin(), waiting_.end(), [&](const Waiting& object) { return object.lob == value.data; })
+        ->length;
 }
 
 Status ObjectValues::ReadWhole(std::size_t index, Datum& value) {

@@ -76,7 +76,7 @@ std::size_t Operands::OperandEnd(std::size_t first) const {
     if (IsWord(At(at), "case")) return CaseEnd(at);
     if (!IsOperand(at)) return first;
     ++at;
-    while (At(at) == "." && IsName(At(at + 1))) at += 2;
+    while (At(at) == ".") at += 2;
     if (At(at) != "(" || !IsName(At(at - 1))) return at;
     if (Partner(at) >= pieces_.size()) return first;
     at = Partner(at) + 1;

@@ -126,7 +126,7 @@ SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
     if (IsIntervalType(column.type)) return Reading::interval;
     switch (column.type) {
         case SQLT_RDD: return Reading::row_id;
-        case SQLT_AFC: return column.size > 0 ? Reading::padded : Reading::as_stored;
+        case SQLT_AFC: return Reading::padded;
         case SQLT_BIN:
         case SQLT_LBI:
         case SQLT_BLOB: return Reading::bytes;

@@ -32,7 +32,6 @@ Status SqliteQuery::Start(RowSource& source, std::uint32_t row, bool& has_row) {
         if (again || status.Ok()) status = std::move(followed);
     }
     if (status.Ok() && has_row) DescribeFromRow();
-    else if (status.Ok()) Columns();
     return status;
 }
 
@@ -210,7 +209,6 @@ void SqliteQuery::Fill() {
         switch (sqlite3_value_type(stored)) {
             case SQLITE_INTEGER:
                 value->kind = Kind::integer;
-                value->length = 0;
                 value->integer = sqlite3_value_int64(stored);
                 if (*reading == Reading::row_id) FillRowId(index, *value);
                 if (*reading == Reading::lob) FillLob(index, *value);
@@ -218,7 +216,6 @@ void SqliteQuery::Fill() {
                 break;
             case SQLITE_FLOAT:
                 value->kind = Kind::real;
-                value->length = 0;
                 value->real = sqlite3_value_double(stored);
                 break;
             case SQLITE_TEXT:

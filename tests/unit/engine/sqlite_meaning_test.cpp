@@ -47,10 +47,12 @@ protected:
     }
     void MakeTables() {
         MustRun("create table t(id integer, d date, c char(5), n number, r raw(2), v varchar2(9))");
-        MustRun("create table u(id integer, e timestamp, d varchar2(20), c varchar2(9), n number)");
+        MustRun("create table u(id integer, e timestamp, d varchar2(20), c varchar2(9), n number, f decfloat(16))");
         MustRun("insert into t values(1, '03-FEB-24', 'ab', 5, '0A', 'x ')");
         MustRun("insert into t values(2, '01-DEC-99', 'abc', 10, '0B', 'x')");
-        MustRun("insert into u values(1, '03-FEB-24 10.00.00 AM', '03-FEB-24', 'ab   ', 1)");
+        MustRun("insert into u values(1, '03-FEB-24 10.00.00 AM', '03-FEB-24', 'ab   ', 1, '1.500000000000000001')",
+                "create table few(id integer, n number)", "insert into few values(1, 5)",
+                "create view part as select id, n, d from t");
     }
 };
 
@@ -61,6 +63,12 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from t where d <= %", "01-JAN-20", "2;"}, {"select id from t where % < t.d", "01-JAN-20", "1;"},
         {"select id from t where d not between '01-JAN-00' and %", "31-DEC-20", "1;2;"},
         {"select id from t where c not in (%)", "ab ", "2;"}, {"select id from t where c <> %", "abc     ", "1;"},
+        {"select id from t where c < %", "abcdefgh", "1;2;"}, {"select id from u where f = %", "1.5", "1;"},
+        {"select id from u where f < %", "1.500000000000000001", "1;"},
+        {"select case d when % then 1 end as a, case v when 'x' then 2 end as b from t", "03-FEB-24", "1,-;-,2;"},
+        {"select id from t where % = trunc(d) and (id = 1)", "03-FEB-24", "1;"},
+        {"select id from (select id, d 'day' from t) x where day > %", "01-JAN-24", "1;"},
+        {"select id from (select id, d as 'it''s' from t) x where \"it's\" > %", "01-JAN-24", "1;"},
         {"select id from t where n > %", "7", "2;"}, {"select id from t where n = %", "x", "!1722"},
         {"select id from t where (d = % or 1 = 0)", "03-FEB-24", "1;"},
         {"select id from t where substr(c, 1, 2) = %", "ab", "1;2;"},
@@ -100,7 +108,8 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from (select t.*, 1 as one from t) where d > % and one = 1", "01-JAN-24", "1;"},
         {"select id from (select distinct id, trunc(d) day from t) x where x.day = %", "03-FEB-24", "1;"},
         {"with x(a, b) as (select id, d from t) select a from x where b > %", "01-JAN-24", "1;"},
-        {"with x(k, a, d, e, f, g, h) as (select 1, y.* from u, (select * from t) y) select a from x where d > %", "31-JAN-24", "1;"},
+        {"with x(k, a, d, e, f, g, h) as (select 1, y.* from (select n, c from u) z, (select * from t) y)"
+         " select a from x where d > %", "31-JAN-24", "1;"},
         {"select id from t where coalesce(null, d) > %", "31-JAN-24", "1;"},
         {"select id from t where d = nvl(d, %) and nvl(null, nvl(d, sysdate)) > %", "31-JAN-24", "1;"},
         {"select id from t where case when id = 2 then d else % end > '31-JAN-24'", "03-FEB-24", "1;"},
@@ -117,6 +126,17 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select t.id from t join u x on t.d = % where x.d = '03-FEB-24'", "03-FEB-24", "1;"},
         {"select id from t where c = % or c = 'it''s'", "ab ", "1;"},
         {"select id from t where c in (select c from t where c = %)", "ab ", "1;"},
+        {"with x(a, b, c, e, f, g) as (select * from few natural join t) select a from x where c = %", "03-FEB-24", "1;"},
+        {"with x(a, b, c, e) as (select * from few natural left outer join (select id, n as k, d from t) y)"
+         " select a from x where e = %", "03-FEB-24", "1;"},
+        {"with x(a, b, c, e, f) as (select * from few join part using (ID, n) left join part z using(id))"
+         " select a from x where c = %", "03-FEB-24", "1;"},
+        {"with x(a, b, c) as (select * from few natural join y), y(n, id, q) as (select n, id, d from t)"
+         " select a from x where c = %", "03-FEB-24", "1;"},
+        {"select id from (with x(i, y) as (select id, d from t) select i as id from x where y = %) union all"
+         " select k from (with x(y, k) as (select c, 7 as k from t) select k from x where y = 'ab')", "03-FEB-24", "1;7;"},
+        {"with x(a, b, c, e, f, g) as (select t.* from few join t using (id)) select a from x where b = %", "03-FEB-24",
+         "1;"},
         {"select id from t where v = %", "x", "2;"}, {"select id from u where c = %", "ab", ""},
         {"select id from t where r = %", "0a", "1;"}, {"select id from t where r = x'0A' and v > %", "a", "1;"},
         {"select id from t where n = %", "5.0", "1;"}, {"select id from t where d > %", "today", "!1858"},
@@ -182,7 +202,8 @@ TEST_F(SqliteMeaning, WhatCannotBeComparedRightlyIsRefused) {
     for (const char* right : {"select id from t where id = 1 and (n = 5) or n = 6",
                               "select case when id = 1 then 1 else 2 end from t where id = 1",
                               "select id from t where id = case id when 1 then 1 end order by id",
-                              "select t.id from t join u on t.id = u.id where t.id = 1", "select id from t where id = 1 order by n = 5, n = 6",
+                              "select t.id from t join u on t.id = u.id where t.id = 1",
+                              "select id from t where (id, d) = (select 1, d from t where id = 1)", "select id from t where id = 1 order by n = 5, n = 6",
                               "select id from t where id = 1 group by id having count(*) = 1",
                               "select t.id from t, u where t.id = 1 and '03-FEB-24' in (t.d, u.e, null, '1') and 'x' not in (t.v, t.c)"})
         EXPECT_EQ(Rows(right), "1;") << right;
@@ -226,6 +247,9 @@ TEST_F(SqliteMeaning, ValuesAreMadeToFitWhereverTheyAreStored) {
         {"with s as (select '03-FEB-24' as d) insert into w(id, d) select 1, d from s", "1,2024-02-03 00:00:00,-;"},
         {"insert into w values(0, null, 'q') on conflict(id) do update set d = '03-FEB-24', c = 'ab'",
          "0,2024-02-03 00:00:00,ab   ;"},
+        {"insert into w values(0, '03-FEB-24', 'q') on conflict(id) do update set d = excluded.d"
+         " where excluded.d < '01-JAN-25' and w.d is null",
+         "0,2024-02-03 00:00:00,-;"},
         {"insert into w select 0, null, 'q' where 1 = 1 on conflict(id) do update set d = '03-FEB-24'",
          "0,2024-02-03 00:00:00,-;"},
         {"update w set (d, c) = ('03-FEB-24', 'ab')", "0,2024-02-03 00:00:00,ab   ;"},

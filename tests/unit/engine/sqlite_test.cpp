@@ -51,7 +51,8 @@ TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
 // The same value through a placeholder, as a literal, from a query and by an update.
 TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
     MustRun("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
-            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18), z number(2,3), u varchar2(40))");
+            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18), z number(2,3), u varchar2(40), "
+            "y kelp_decfloat(34), q timestamp with time zone, l span_ym(2), o span_ds(1,2))");
     const struct { const char* column; const char* literal; const char* outcome; } cases[] = {
         {"n", "'12.345'", "real 12.35"}, {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"},
         {"n", "-1000", "error 1438"}, {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"},
@@ -65,16 +66,26 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
         {"d", "'30-FEB-24'", "error 1839"}, {"d", "'x'", "error 1858"}, {"d", "5", "error 932"},
         {"s", "'03-FEB-24 04.05.06.5 PM'", "time 2024-02-03 16:05:06.5"}, {"r", "'0aFF'", "bytes 0aff"},
         {"r", "'0aFF00'", "error 12899"}, {"r", "'0g'", "error 1465"}, {"r", "x'0102'", "bytes 0102"},
-        {"x", "'1.23456789012345678'", "decimal 1.234567890123457"}, {"b", "'any text at all'", "any text at all"},
+        {"x", "'1.23456789012345678'", "decimal 1.234567890123457"},
+        {"x", "'9.99999999999999999e125'", "error 1426"},
+        {"y", "'1.2345678901234567890123456789012345678'", "decimal 1.234567890123456789012345678901235"},
+        {"b", "'any text at all'", "any text at all"},
         {"e", "-999999999999999999", "-999999999999999999"}, {"e", "1000000000000000000", "error 1438"},
         {"n", "null", "null"}, {"n", "1e3", "error 1438"}, {"z", "0", "0"}, {"z", "1", "error 1438"}, {"z", "0.012", "real 0.012"},
-        {"z", "0.12", "error 1438"}, {"r", "'0:'", "error 1465"}, {"r", "5", "error 932"}, {"d", "''", "null"},
-        {"u", "kelp_number('123456789012345678901234567890.5')", "123456789012345678901234567890.5"}};
+        {"z", "0.12", "error 1438"}, {"r", "'0:'", "error 1465"}, {"r", "'/0'", "error 1465"}, {"r", "5", "error 932"},
+        {"d", "''", "null"},
+        {"u", "kelp_number('123456789012345678901234567890.5')", "123456789012345678901234567890.5"},
+        {"q", "'03-FEB-24 04.05.06.5 PM +02:00'", "time 2024-02-03 16:05:06.5 +02:00"},
+        {"s", "'03-FEB-24 04.05.06.5 PM +02:00'", "error 1830"},
+        {"w", "12345.6", "12300"}, {"w", "99950.5", "error 1438"}, {"l", "'1-2'", "+01-02"}, {"l", "''", "null"},
+        {"l", "'100-0'", "error 1873"},
+        {"l", "14", "error 932"}, {"l", "'1 2:0:0'", "error 1867"}, {"o", "'1 2:3:4.567'", "+1 02:03:04.57"},
+        {"o", "'1-2'", "error 1867"}};
     for (const auto& c : cases) {
         const std::string column = c.column, literal = c.literal;
         const std::string want = std::string(c.outcome) + ';';
         const auto outcome = [&](int error) {
-            return error ? "error " + std::to_string(error) + ';' : Query("select " + column + (column == "b" ? " || ''" : "") + " from t");
+            return error ? "error " + std::to_string(error) + ';' : Query("select distinct " + column + (column == "b" ? " || ''" : "") + " from t");
         };
         MustRun("delete from t");
         EXPECT_EQ(outcome(Run("insert into main.t(" + column + ") values(" + literal + ")")), want) << literal;
@@ -87,8 +98,12 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
         if (literal.front() != '\'') continue;
         MustRun("delete from t");
         const Datum bound = Text(std::string_view(literal).substr(1, literal.size() - 2));
-        EXPECT_EQ(outcome(Run("insert into t(" + column + ") values(?1)", {bound})), want) << "bound " << literal;
+        Rows twice{{bound}, {bound}};
+        EXPECT_EQ(outcome(Execute(*Prepared("insert into t(" + column + ") values(?1)"), twice)), want) << "bound " << literal;
     }
+    OCINumber none;
+    std::memset(&none, 0xFF, sizeof none);
+    EXPECT_EQ(Run("insert into t(n) values(?1)", {Decimal(none)}), 1722);
 }
 
 // A statement that is compiled once goes with its tables, whoever makes them anew: what its values are for is what the
@@ -137,16 +152,20 @@ TEST_F(Sqlite, RowIdOfAChangeIsOfItsTable) {
 }
 
 TEST_F(Sqlite, ColumnsAreDescribed) {
-    ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR (5), d timestamp_tz(3), "
-                  "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5))"), 0);
-    const auto query = Prepared("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, 1+1, cast(a as blob), rowid, "
+    ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR  ( 5 ), d timestamp_tz(3), "
+                  "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5), "
+                  "j float(63), k float(200), l number(50,-90), m timestamp(12), n double  precision)"), 0);
+    const auto query = Prepared("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, j, k, l, m, n, 1+1, cast(a as blob), rowid, "
                                "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', kelp_varchar(ifnull(b, 'x'), 9), count(kelp_date(b )) from t");
     struct Expected { const char* name; std::uint16_t type; std::uint32_t size; int precision, scale; bool nullable; };
     const Expected expected[] = {{"A", SQLT_NUM, 22, 12, 2, false}, {"Mixed", SQLT_CHR, 20, 0, 0, true}, {"C", SQLT_AFC, 5, 0, 0, true},
                                  {"D", SQLT_TIMESTAMP_TZ, 13, 0, 3, true}, {"E", SQLT_NUM, 22, 0, -127, true},
                                  {"F", SQLT_CLOB, 4000, 0, 0, true}, {"G", SQLT_CHR, 0, 0, 0, true},
                                  {"ID", SQLT_NUM, 22, 38, 0, false}, {"H", SQLT_BDOUBLE, 16, 34, -127, true},
-                                 {"I", SQLT_NUM, 22, 5, 0, true}, {"1+1", SQLT_NUM, 22, 0, -127, true},
+                                 {"I", SQLT_NUM, 22, 5, 0, true}, {"J", SQLT_NUM, 22, 63, -127, true},
+                                 {"K", SQLT_NUM, 22, 126, -127, true}, {"L", SQLT_NUM, 22, 38, -84, true},
+                                 {"M", SQLT_TIMESTAMP, 11, 0, 9, true}, {"N", SQLT_NUM, 22, 126, -127, true},
+                                 {"1+1", SQLT_NUM, 22, 0, -127, true},
                                  {"CAST(A AS BLOB)", SQLT_BLOB, 4000, 0, 0, true}, {"ROWID", SQLT_RDD, 18, 0, 0, false},
                                  {"CAST(CAST(E AS DECFLOAT(16)) AS VARCHAR2(9)) || 'x'", SQLT_CHR, 0, 0, 0, true},
                                  {"CAST(IFNULL(B, 'x') AS VARCHAR2(9))", SQLT_CHR, 9, 0, 0, true},
@@ -180,7 +199,8 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
         {"to_char('2024-02-09 13:14:15'), to_char('2024-02-09 13:14:15', 'YYYY/MM/DD HH24:MI')",
          "09-FEB-24,2024/02/09 13:14;"},
         {"to_char(1234.5, '9,999.00'), to_char(0.5), to_char('abc'), to_char(99.96, '99.9'), to_char(null, '9')",
-         " 1,234.50,.5,abc,#####,null;"},
+         " 1,234.50,.5,abc,#####,null;"}, 
+        {"to_char('10:20:30'), to_char(to_timestamp('090224 5', 'DDMMRR FF'))", "10:20:30,09-FEB-24 12.00.00.500000 AM;"},
         {"to_char('x', '99')", "error 1722"}, {"to_char(1, 'Q')", "error 1481"},
         {"to_date('09.02.2024', 'DD.MM.YYYY'), to_date('9-feb-24')",
          "time 2024-02-09 00:00:00,time 2024-02-09 00:00:00;"},
@@ -192,13 +212,17 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
         {"to_number('1x')", "error 1722"}, {"to_number('1x', '99')", "error 1722"},
         {"add_months('2024-01-31 10:00:00', 1), add_months('2024-02-29', -12)",
          "time 2024-02-29 10:00:00,time 2023-02-28 00:00:00;"},
-        {"add_months('2024-01-31', 1000000)", "error 1841"}, {"add_months(5, 1)", "error 932"},
+        {"add_months('2024-01-31', 1000000)", "error 1841"}, {"add_months('x', 1)", "error 1858"},
+        {"add_months('2024-01-31', 'x')", "error 1722"}, {"add_months(5, 1)", "error 932"},
         {"add_months('10:00:00', 1)", "error 932"},
         {"months_between('2024-03-31', '2024-02-29'), months_between('2024-01-01', '2024-02-17'),"
          " months_between('0001-01-05', '-0001-01-05')", "1,decimal -1.51612903225806451612903225806451612903,12;"},
         {"last_day('2024-02-01 01:02:03'), next_day('2024-02-09', 'friday'), next_day('2024-02-09', 1)",
          "time 2024-02-29 01:02:03,time 2024-02-16 00:00:00,time 2024-02-11 00:00:00;"},
         {"next_day('2024-02-09', 'nonday')", "error 1846"}, {"next_day('2024-02-09', 8)", "error 1846"},
+        {"next_day('2024-02-09', 0)", "error 1846"},
+        {"next_day('2024-02-09', 7), next_day('x', 1)", "error 1858"},
+        {"next_day('2024-02-09', 7)", "time 2024-02-10 00:00:00;"},
         {"next_day('10:00:00', 'friday')", "error 932"},
         {"trunc(2.79), trunc(-2.79, 1), trunc(1279, -2), trunc('5.5')", "2,real -2.7,1200,5;"},
         {"trunc('2024-02-09 13:14:15'), trunc(to_date('09-02-24', 'DD-MM-YY'), 'yyyy')",
@@ -211,19 +235,32 @@ TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
          "2024-08-15 13:00:00,2024-08-15 13:14:00,-0200-01-01 00:00:00,2001-01-01 00:00:00;"},
         {"trunc('2024-08-15', 'xx')", "error 1898"}, {"trunc(x'01')", "error 1722"},
         {"hextoraw('abc'), hextoraw('a'), rawtohex(x'0aff'), rawtohex('A'), length(empty_clob()), length(empty_blob())",
-         "bytes 0abc,bytes 0a,0AFF,41,0,0;"}, {"hextoraw('0g')", "error 1465"},
+         "bytes 0abc,bytes 0a,0AFF,41,0,0;"}, {"hextoraw('0g')", "error 1465"}, {"hextoraw('0@')", "error 1465"},
         {"rawtohex(5)", "error 932"}, {"lpad('x', 1e19)", "error 1426"},
         {"months_between('2024-03-10 12:00:00', '2024-02-09')", "decimal 1.0483870967741935483870967741935483871;"},
         {"decode(2, 1, 'a', 2, 'b'), decode(null, 1, 'a', null, 'n'), decode(3, 1, 'a'), decode(3, 1, 'a', 'else'),"
          " decode('1', 1, 'same')", "b,n,null,else,same;"},
-        {"decode('x', 1, 'a')", "error 1722"}, {"decode(1, 2)", "error 938"},
+        {"decode('x', 1, 'a')", "error 1722"}, {"decode(1, null, 'n', 'else'), decode(null, 1, 2, 'else')", "else,else;"},
+        {"decode(1, 2)", "error 938"},
         {"greatest(1, 10, 9), least('b', 'a', 'c'), greatest(1, null), least(0.5)", "10,a,null,real 0.5;"},
-        {"greatest()", "error 938"}, {"initcap('the QUICK-fox o''neil äB')", "The Quick-Fox O'Neil äb;"},
-        {"lpad('ä', 4, 'xö'), rpad('abc', 2), lpad('x', 0), rpad(5, 3, '*'), lpad('x', 3, '')",
-         "xöxä,ab,null,5**,null;"},
+        {"greatest()", "error 938"},
+        {"initcap('the QUICK-fox o''neil äB'), initcap('ÀA zZz a9A a0A a:b a/b a@b a[b a`b a{b')",
+         "The Quick-Fox O'Neil äb,Àa Zzz A9a A0a A:B A/B A@B A[B A`B A{B;"},
+        {"lpad('ä', 4, 'xö'), rpad('abc', 2), lpad('x', 0), rpad(5, 3, '*'), lpad('x', 3, ''), lpad('x', 1, ''),"
+         " lpad('x', 2), rpad('xy', 3), length(rpad('x', 32768)), length(rpad('x', 32767))",
+         "xöxä,ab,null,5**,null,x, x,xy ,32767,32767;"},
         {"instr('banana', 'an'), instr('banana', 'an', 1, 2), instr('banana', 'an', -1), instr('banana', 'an', -1, 2),"
          " instr('äöa', 'a'), instr('a', 'a', 0), instr('aaa', 'a', -3, 2), instr('a', 'a', 9)", "2,4,4,2,3,0,0,0;"},
-        {"instr('a', 'a', 1, 0)", "error 1428"},
+        {"instr('a', 'a', 1, 0)", "error 1428"}, {"instr('a', 'a', 'x', 1)", "error 1722"},
+        {"instr('a', 'a', 'x', 0)", "error 1722"},
+        {"instr(9e999, 'a', 1)", "error 1426"}, {"instr('a', 9e999, 1)", "error 1426"},
+        {"substr(9e999, 1, 1)", "error 1426"}, {"substr('a', 'x', 1)", "error 1722"},
+        {"lpad(9e999, 1)", "error 1426"}, {"initcap(9e999)", "error 1426"}, {"kelp_varchar(9e999, 9)", "error 1426"},
+        {"kelp_decfloat('x', 16)", "error 1722"},
+        {"kelp_number(5.5e84, 3, -90)", "real 6e+84;"}, {"kelp_number('1e126')", "error 1426"},
+        {"to_number('1E+200', '9EEEE')", "error 1426"},
+        {"length(kelp_sysdate()), kelp_systimestamp() like '____-__-__ __:__:__%___:__',"
+         " kelp_localtimestamp() like '____-__-__ __:__:__%:%'", "19,1,0;"},
         {"substr('äbc', 0, 2), substr('abc', -2), substr('abc', -5, 3), substr('abc', 2, -1), substr('abc', 4),"
          " substr(1.5, 1, 2), substr(x'010203', 2)", "äb,bc,null,null,null,1.,bytes 0203;"}};
     for (const auto& c : cases) EXPECT_EQ(Query(std::string("select ") + c.list), c.row) << c.list;
@@ -265,12 +302,16 @@ TEST_F(Sqlite, RefusedValueNamesItsColumn) {
 
 
 TEST_F(Sqlite, FailedCompilationTellsWhoSaysSo) {
-    std::unique_ptr<engine::Query> query;
-    std::uint32_t offset = 0;
-    const Status status = connection_->Compile({"select 1 frm t", Effect::reads, {}}, query, offset);
-    EXPECT_EQ(status.Number(), 900);
-    EXPECT_EQ(offset, 13u);
-    EXPECT_STREQ(status.Engine(), "SQLITE");
+    const struct { const char* sql; int number; unsigned offset; } cases[] = {
+        {"select 1 frm t", 900, 13}, {"select 1; select 2", 933, 9}, {"select 1; selct 2", 933, 9}};
+    for (const auto& c : cases) {
+        std::unique_ptr<engine::Query> query;
+        std::uint32_t offset = 0;
+        const Status status = connection_->Compile({c.sql, Effect::reads, {}}, query, offset);
+        EXPECT_EQ(status.Number(), c.number) << c.sql;
+        EXPECT_EQ(offset, c.offset) << c.sql;
+        EXPECT_STREQ(status.Engine(), "SQLITE");
+    }
 }
 
 // Texts in UTF-16 come and go as UTF-8, empty ones too.
@@ -407,7 +448,10 @@ TEST_F(Sqlite, SchemasAndTheDatabaseAreDescribed) {
     ASSERT_EQ(Answer(connection_->Describe("main.t", engine::ObjectKind::any, object)), 0);
     EXPECT_EQ(object.columns[0].name, "N");
     EXPECT_FALSE(object.temporary);
-    MustRun("create table \"o`d\"(n integer)");
+    MustRun("create table \"o`d\"(n integer)", "create table main.w(n integer primary key) without rowid");
+    EXPECT_FALSE(object.index_only);
+    EXPECT_EQ(Answer(connection_->Describe("W", engine::ObjectKind::any, object)), 0);
+    EXPECT_TRUE(object.index_only);
     EXPECT_EQ(Answer(connection_->Describe("\"o`d\"", engine::ObjectKind::table, object)), 0);
     ASSERT_EQ(Answer(connection_->Describe("TEST", engine::ObjectKind::database, object)), 0);
     EXPECT_EQ(object.members, (std::vector<std::string>{"TEMP", "MAIN"}));

@@ -86,6 +86,8 @@ TEST(SqlText, KindOfStatement) {
         {"explain update t set a = 1", StatementType::unknown, sql::Run::other, 27},
         {"begin exclusive", StatementType::begin, sql::Run::begin, 34},
         {"explain plan for select 1", StatementType::unknown, sql::Run::other, 27},
+        {"explain query plan select 1", StatementType::unknown, sql::Run::other, 27},
+        {"with commit(x) as (select 1) insert into t select x from commit", StatementType::insert, sql::Run::change, 3},
     };
     for (const auto& c : cases) {
         const sql::StatementText statement = sql::Scan(c.text);
@@ -104,6 +106,7 @@ TEST(SqlText, PlaceholdersOutsideOfQuotesAndComments) {
         {"select * from t where rowid = :r and :s < t.rowid and rowid in (:u, 'x', :v) and a = :w", "@R @S @U @V W"},
         {"select :\xc3\xa4rger", "\xc3\xa4RGER"},
         {"create trigger g after insert on t begin insert into l values(:new.a); end;", ""}, {"select : a", ""},
+        {"select /**/:a, /***/:b, 1e-:c, 1e+5:d, q:e from t /*/:f*/ where rowid <:g", "A B C D E @G"},
     };
     for (const auto& c : cases) EXPECT_EQ(Names(sql::Scan(c.text)), c.names) << c.text;
 }
@@ -158,6 +161,7 @@ TEST(SqlText, WhatTheTextTellsToBeWrong) {
     }
     EXPECT_EQ(sql::Scan(std::string_view("select 1\0", 9)).error, 911);
     EXPECT_EQ(sql::Scan("select 1 ; ;").error, 0);
+    EXPECT_EQ(sql::Scan(std::string_view("select q'").substr(0, 8)).error, 0);
 }
 
 TEST(SqlText, SpellingsOfTheEngine) {
@@ -166,7 +170,10 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"select sysdate, t.sysdate, sysdate(1), 'sysdate' as sysdate",
          "select (now()), t.sysdate, sysdate(1), 'sysdate' as sysdate"},
         {"select 1 from dual", "select 1 from (select 'X' as dummy) as dual"},
-        {"select 1 minus select 2", "select 1 except select 2"}, {"select minus from t", "select minus from t"},
+        {"select 1 minus select 2", "select 1 except select 2"},
+        {"select date 'x' minus select date '2024-2-9' minus select 1",
+         "select date 'x' except select '2024-02-09 00:00:00' except select 1"},
+        {"select minus from t", "select minus from t"},
         {"select d.dummy from DUAL d where 1=1", "select d.dummy from (select 'X' as dummy) d where 1=1"},
         {"create table t(number number(10,2), raw long raw, v varchar2(20 char), x number(*,3))",
          "create table t(number numeric(10,2), raw blob, v varchar_c(20 ), x numeric(38,3))"},
@@ -174,14 +181,14 @@ TEST(SqlText, SpellingsOfTheEngine) {
          "create table t(a numeric, primary key(number, raw), b numeric default (1 * 2))"},
         {"create table t(a number default -1 not null, b date default sysdate, c number default f(1, 2) unique)",
          "create table t(a numeric default -1 not null, b date default (now()), c numeric default (f(1, 2)) unique)"},
-        {"create table t(a number default (1) + 2, b number default null null, c char(3) default user)",
-         "create table t(a numeric default ((1) + 2), b numeric default null null, c char(3) default (user))"},
+        {"create table t(a number default (1) + 2, b number default null null, c char(3) default nvl(null, user) unique)",
+         "create table t(a numeric default ((1) + 2), b numeric default null null, c char(3) default (nvl(null, user)) unique)"},
         {"alter table t add a number default 1 + 1 not null", "alter table t add a numeric default (1 + 1) not null"},
         {"alter table t add a number default 1 + 1", "alter table t add a numeric default (1 + 1)"},
         {"create table t(a varchar2(9 byte), b nvarchar2(9), c char(9 char), d char varying(2 CHAR) default 'x')",
          "create table t(a varchar(9 ), b nvarchar2(9), c char_c(9 ), d char varying_c(2 ) default 'x')"},
-        {"select cast(a as char(9 char)), cast(a as char(9 byte)) from t",
-         "select to_char_c(a , 9), to_char(a , 9) from t"},
+        {"select cast(a as char(9 char)), cast(a as char(9 byte)), cast(a as char(*, 3)) from t",
+         "select to_char_c(a , 9), to_char(a , 9), to_char(a , 38, 3) from t"},
         {"alter table number add number number", "alter table number add number numeric"},
         {"alter table t alter column number type number(5)", "alter table t alter column number type numeric(5)"},
         {"create trigger g after insert on t begin update l set a = :new.a; end",
@@ -196,6 +203,7 @@ TEST(SqlText, SpellingsOfTheEngine) {
         {"insert into t values(date '2024-2-9', timestamp '2024-02-09 10:11:12.5', date 'x')",
          "insert into t values('2024-02-09 00:00:00', '2024-02-09 10:11:12.5', date 'x')"},
         {"insert into t values(:a :b, :c:i)", "insert into t values(?1 ?2, ?3)"}, {"select 1 ;  ", "select 1"},
+        {"truncate table t", "delete from t"},
     };
     for (const auto& c : cases) EXPECT_EQ(Rewritten(c.text), c.rewritten) << c.text;
 }
@@ -216,6 +224,9 @@ TEST(SqlText, SpellingsThatADialectAsksFor) {
     dialect.decode = &kDecode;
     const struct { const char* text; const char* rewritten; } cases[] = {
         {"create table t(a raw(9) not null, b raw)", "create table t(a bytea not null, b bytea)"},
+        {"create table t(a raw(9", "create table t(a bytea"},
+        {"create trigger g after insert on t begin update l set a = decode(b, 1, 2); end",
+         "create trigger g after insert on t begin update l set a = decode(b, 1, 2); end"},
         {"select nvl(a, ''), b.nvl(1), nvl from t", "select coalesce(a, null), b.nvl(1), nvl from t"},
         {"select rowid, t.rowid from t", "select ctid, t.ctid from t"},
         {"select x'0A', x from \"T\"", "select <0A>, x from \"q\""},

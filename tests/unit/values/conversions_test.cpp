@@ -64,6 +64,8 @@ TEST_F(Conversions, TextAndBytesInEachLayout) {
         {"'abc'", SQLT_STR, 1, "00", 0, 3}, {"'abc'", SQLT_AFC, 5, "6162632020", 5, 0},
         {"'abc'", SQLT_AFC, 2, "6162", 2, 3}, {"'abc'", SQLT_VCS, 6, "030061626323", 5, 0},
         {"'abc'", SQLT_VCS, 4, "02006162", 4, 3}, {"'abc'", SQLT_AVC, 5, "0300616263", 5, 0},
+        {"'a'", SQLT_VCS, 4, "01006123", 3, 0}, {"'a'", SQLT_CHR, 1, "61", 1, 0},
+        {"x'0A'", SQLT_VBI, 4, "01000A23", 3, 0}, {"x'0A'", SQLT_BIN, 1, "0A", 1, 0},
         {"'abc'", SQLT_LVC, 8, "0300000061626323", 7, 0},
         {"'a\xc3\xa4'", SQLT_CHR, 2, "6123", 1, 3},    // never half a character
         {"x'0AFF'", SQLT_CHR, 4, "30414646", 4, 0}, {"x'0AFF'", SQLT_BIN, 3, "0AFF23", 2, 0},
@@ -87,8 +89,13 @@ TEST_F(Conversions, NumbersAsText) {
     const struct { const char* expression; const char* text; const char* on_server = nullptr; } cases[] = {
         {"0", "0"}, {"-12", "-12"}, {"9223372036854775807", "9223372036854775807"}, {"0.5", ".5"}, {"-0.25", "-.25"},
         {"1e15", "1000000000000000"}, {"123456.789", "123456.789"}, {"1e-7", ".0000001"},
-        {"1e39", "1000000000000000000000000000000000000000"}, {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"},
-        {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf", "!1426"}, {"-9e999", "-Inf", "!1426"}, {"0.1 + 0.2", ".3"},
+        {"1e39", "1000000000000000000000000000000000000000"}, {"123456789.5", "123456789.5"}, {"0.00001", ".00001"},
+        {"-1e-6", "-.000001"},
+        {"123456.789012345", "123456.789012345"}, {"-1234567.89012345", "-1234567.89012345"}, {"1e14", "100000000000000"},
+        {"1e60", "1E+60"}, {"-1.5e-60", "-1.5E-60"}, {"0.0", "0"},
+        {"100.0", "100"}, {"-0.0", "0"}, {"9e999", "Inf", "!1426"}, {"-9e999", "-Inf", "!1426"}, {"1e200", "!1426"},
+        {"1e-200", "!1426", "0"},
+        {"0.1 + 0.2", ".3"},
         {"4.35 * 100", "435"}, {"-0.00001", "-.00001"}, {"1 / 3.0", ".333333333333333", ".33333333333333333333"},
         {"cast('12345678901234567890123456789.5' as number)", "12345678901234567890123456789.5"}};
     for (const auto& c : cases)
@@ -398,12 +405,23 @@ TEST_F(Conversions, IntervalsInExpressions) {
             "create table others(ym interval year(4) to month, v varchar2(40))", "create view seen as select ym as m from spans",
             "insert into spans values(interval '1-2' year to month, cast('2' as interval day to second), '1-2', 14, date '2024-02-09')");
     MustRun("insert into spans(ym, ds) values(interval '-0-3' year to month, interval '1 2:3:4.5' day(1) to second(1))",
-            "insert into main.others(ym, v) select ym, ym from spans", "update or replace others set ym = (select max(s.ym) from spans s), v = ym where ym > '0-0'");
+            "insert into main.others(ym, v) select ym, ym from spans",
+            "update or replace others set ym = (select max(s.ym) from spans s), v = ym where ym > '0-0'",
+            "update spans set ym = v where v = '1-2'", "create table more(ym interval year(4) to month, v varchar2(40), k integer primary key)",
+            "insert into more(k) values(1)",
+            "update more set (ym, v) = (select ym, ym from spans where n = 14)",
+            "insert into more(k, ym) values(1, '0-5') on conflict(k) do update set ym = excluded.ym where more.ym > excluded.ym",
+            "create temp view shown as select ym as m from spans", "insert into spans(ym, ds) values('', '')", "delete from spans where ym is null");
     const struct { const char *sql, *answer; } cases[] = {
         {"select cast('1-2' as interval year(3) to month) from dual", "+001-02"},
         {"select cast('1 2:3:4.56' as interval day to second(1)) from dual", "+01 02:03:04.6"},
         {"select interval '1 2:3:4.56' day(4) to second from dual", "+0001 02:03:04.560000"},
-        {"select max(ym) from spans", "+01-02"},
+        {"select max(ym) from spans", "+01-02"}, {"select n from spans where ym = (select max(ym) from spans)", "14"},
+        {"select n from spans where ym < '100-0' and n = 14", "14"},
+        {"select count(*) from spans where ds < '1 2:3:4.50049'", "1"},
+        {"select max(m) from shown", "+01-02"}, {"select ym || v from more", "+0000-05+01-02"},
+        {"select count(all ym) from spans", "2"},
+        {"select cast('1-2' as interval year(12) to month) from dual", "+000000001-02"},
         {"select v || min(ym) over () from spans where v is not null", "1-2+01-02"},
         {"select ym from spans where ym = interval '1-2' year to month", "+01-02"},
         {"select count(distinct ym) from spans where ym in (select o.ym from others o)", "2"},
@@ -450,6 +468,10 @@ TEST_F(Conversions, IntervalsInExpressions) {
         {"select count(*) from others o, spans s where '1-2' in (o.ym, s.n)", "!932"},
         {"select n from spans where '1-2' between ym and n", "!932"},
         {"select n from spans where ym between 1 and 20", "!932"},
+        {"select n from spans where ym between 1 and '1-3'", "!932"},
+        {"select n from spans where ym is '1-2'", "!932"}, {"select n from spans where ym not like '1%'", "!932"},
+        {"select max(ym, ym) from spans", "!932"}, {"select n from spans where max(ym, '1-2') = ym", "!932"},
+        {"create view largest as select max(ym) from spans", "!932"},
         {"select n from spans where ym between '1-0' and 3", "!932"},
         {"select n from spans where 1 between ym and '1-3'", "!932"},
         {"select n from spans where '1-2' between ym and ym + 1", "!932"},
