@@ -92,6 +92,12 @@ std::vector<std::string_view> Split(std::string_view sql) {
     return pieces;
 }
 
+std::string Lower(std::string_view text) {
+    std::string lower(text);
+    for (char& c : lower) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    return lower;
+}
+
 bool IsWord(std::string_view piece, std::string_view lower) {
     return std::equal(piece.begin(), piece.end(), lower.begin(), lower.end(),
                       [](char a, char b) { return std::tolower(static_cast<unsigned char>(a)) == b; });

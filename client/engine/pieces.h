@@ -36,6 +36,8 @@ struct Span {
 using PieceList = std::vector<std::string_view>;
 PieceList Split(std::string_view sql);
 
+std::string Lower(std::string_view text);    // of ASCII letters
+
 // Without regard to letter case; `lower` is in lower case.
 bool IsWord(std::string_view piece, std::string_view lower);
 

@@ -44,7 +44,6 @@ int OpenFlags(std::uint32_t mode, std::uint32_t create) {
     int flags = kAccessModes[mode] | O_CLOEXEC;
     if (create != OCI_FILE_EXIST) flags |= O_CREAT;
     if (create & OCI_FILE_EXCL) flags |= O_EXCL;
-    if (create & OCI_FILE_APPEND) flags |= O_APPEND;
     return flags;
 }
 
@@ -108,10 +107,8 @@ Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t cre
 int File::GiveUpStream() noexcept {
     std::FILE* stream = std::exchange(stream_, nullptr);
     if (!stream) return 0;
-    errno = 0;
     const bool failed = standard_ ? writable_ && std::fflush(stream) != 0 : std::fclose(stream) != 0;
-    if (!failed) return 0;
-    return errno != 0 ? errno : EIO;
+    return failed ? errno : 0;
 }
 
 Status File::Close() {
@@ -130,7 +127,6 @@ Status File::Read(void* buffer, std::uint32_t size, std::uint32_t* count) {
     return InTurn([&]() -> Status {
         if (!readable_) return Error(errors::kAccessDenied, name_ + ": not open for reading");
         Turn(Last::read);
-        errno = 0;
         *count = static_cast<std::uint32_t>(std::fread(buffer, 1, size, stream_));
         const bool failed = *count < size && std::ferror(stream_);
         const int error = errno;
@@ -143,7 +139,6 @@ Status File::Write(const void* data, std::uint32_t size, std::uint32_t* count) {
     return InTurn([&]() -> Status {
         if (!writable_) return Error(errors::kAccessDenied, name_ + ": not open for writing");
         Turn(Last::write);
-        errno = 0;
         *count = static_cast<std::uint32_t>(std::fwrite(data, 1, size, stream_));
         if (*count == size) return {};
         const int error = errno;
@@ -171,7 +166,6 @@ Status File::Seek(std::uint32_t origin, std::uint64_t offset, int direction) {
 Status File::Flush() {
     return InTurn([&]() -> Status {
         if (!writable_) return {};
-        errno = 0;
         return std::fflush(stream_) == 0 ? Status() : SystemError(name_, errno);
     });
 }

@@ -395,9 +395,7 @@ PgConnection::SavepointCommand PgConnection::ReadSavepoint(std::string_view sql)
     if (at < pieces.size()) return {};
     command.name = PlainName(name);
     if (command.name.empty()) return {};
-    if (!name.starts_with('"')) {
-        for (char& c : command.name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
-    }
+    if (!name.starts_with('"')) command.name = Lower(command.name);
     return command;
 }
 

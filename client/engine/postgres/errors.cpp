@@ -141,7 +141,7 @@ std::string_view Field(const PGresult* result, int field) {
 }
 
 std::string_view Trimmed(std::string_view text) {
-    while (!text.empty() && (text.back() == '\n' || text.back() == ' ')) text.remove_suffix(1);
+    while (text.ends_with('\n')) text.remove_suffix(1);
     return text;
 }
 

@@ -3,6 +3,7 @@
 
 #include <utility>
 
+#include "engine/pieces.h"
 #include "engine/postgres/schema.h"
 #include "handles/errors.h"
 
@@ -36,10 +37,8 @@ constexpr const char* kUnknownVersion = "10 or later, PostgreSQL: nobody has log
 }  // namespace
 
 std::string RoleName(std::string_view name) {
-    std::string role;
-    if (name.size() >= 2 && name.front() == '"' && name.back() == '"') return role.assign(name.substr(1, name.size() - 2));
-    for (const char c : name) role += static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
-    return role;
+    const bool is_quoted = name.size() >= 2 && name.front() == '"' && name.back() == '"';
+    return is_quoted ? std::string(name.substr(1, name.size() - 2)) : Lower(name);
 }
 
 // A refused user is an answer, too.

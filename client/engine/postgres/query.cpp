@@ -7,6 +7,7 @@
 #include <new>
 #include <utility>
 
+#include "engine/pieces.h"
 #include "handles/errors.h"
 
 namespace engine::postgres {
@@ -91,8 +92,7 @@ bool PgQuery::RetypesTimes(std::vector<Oid>& types) const {
 // insert ... values, of one row or a few: whose row ids are few, too.
 bool PgQuery::InsertsRows() const {
     if (verb_ != Verb::insert || effect_ != Effect::changes || sql_.ends_with(';')) return false;
-    std::string lower = sql_;
-    for (char& c : lower) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    const std::string lower = Lower(sql_);
     const auto has = [&](const char* words) { return lower.find(words) != std::string::npos; };
     return has("values") && !has("select") && !has("returning") && !has("--");
 }

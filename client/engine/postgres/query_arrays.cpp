@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <new>
 
+#include "engine/pieces.h"
 #include "engine/postgres/query.h"
 #include "engine/postgres/query_objects.h"
 #include "handles/errors.h"
@@ -72,9 +73,7 @@ bool PgQuery::PrepareWhole(std::uint32_t rows) {
 // Has the server prepare the statement over arrays, once.
 bool PgQuery::MakeWhole() {
     const std::vector<Oid>& types = bound_.Types();
-    std::string lower = sql_;
-    for (char& c : lower) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
-    const std::size_t values = lower.find("values");
+    const std::size_t values = Lower(sql_).find("values");
     if (!InsertsRows() || types.empty() || types.size() != kinds_.size()) return false;
     if (!IsPlaceholdersAlone(std::string_view(sql_).substr(values + 6), types.size())) return false;
     std::string given, columns, arrays;

@@ -366,9 +366,7 @@ std::string ShownName(std::string_view name) {
 
 std::string StoredName(std::string_view part) {
     if (part.starts_with('"')) return ShownName(PlainName(part));
-    std::string name(part);
-    for (char& c : name) c = static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
-    return name;
+    return Lower(part);
 }
 
 Reader BinaryReader(Oid type) {

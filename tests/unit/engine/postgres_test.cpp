@@ -92,7 +92,9 @@ TEST_F(Postgres, ServerThatCannotBeReached) {
             EXPECT_EQ(send(peer, words.data(), words.size(), MSG_NOSIGNAL), static_cast<ssize_t>(words.size()));
             close(peer);
         });
-        EXPECT_EQ(Answer(engine::Open("postgresql:///x?host=" + folder_, none)), number) << said;
+        const Status status = engine::Open("postgresql:///x?host=" + folder_, none);
+        EXPECT_EQ(Answer(status), number) << said;
+        if (number == 18) { EXPECT_EQ(status.Detail(), "no"); }
         server.join();
     }
     close(listener);
@@ -410,6 +412,15 @@ TEST_F(Postgres, DeferredConstraintsFailAtTheEnd) {
         EXPECT_FALSE(connection_->InTransaction());
         EXPECT_EQ(Query("select n from t"), "");
     }
+    MustCommit("create table u(n integer)", "create function f() returns trigger language plpgsql as $$ begin raise notice 'last';"
+               " if new.n = 2 then perform pg_terminate_backend(pg_backend_pid()); end if; return null; end $$",
+               "create constraint trigger g after insert on u deferrable initially deferred for each row execute function f()");
+    MustCommit("insert into u values(1)");
+    const auto notices = connection_->TakeNotices();
+    EXPECT_TRUE(notices.size() == 1 && notices[0].Detail() == "last");
+    MustRun("insert into u values(2)");
+    for (const int lost : {3113, 3114}) EXPECT_EQ(Answer(connection_->Commit()), lost);
+    EXPECT_FALSE(connection_->InTransaction());
 }
 
 // Of placeholders alone, in forms that the server's arrays have. A trigger counts the statements that come.

@@ -231,12 +231,16 @@ TEST_F(AttributesTest, DigitsOfDatetimes) {
     // Characters that show a value, bytes that hold it, and what is told of texts alone.
     ASSERT_EQ(Run("create table w(a timestamp(3) with local time zone, b interval year(4) to month,"
                   " c interval day(5) to second(6), d interval day(5) to second(0), e raw(10), f nvarchar2(7), g clob,"
-                  " h long, i varchar2)", 1), 0);
+                  " h long, i varchar2, j date, k number(3), l binary_float, m timestamp)", 1), 0);
+    ASSERT_EQ(Run("create table x(n integer primary key) without rowid", 1), 0);
+    for (const auto& [name, is_index] : {std::pair{"t", 0}, {"x", 1}})
+        EXPECT_EQ(Attribute<ub1>(Described(name, OCI_PTYPE_TABLE), OCI_DTYPE_PARAM, OCI_ATTR_INDEX_ONLY), is_index);
     ASSERT_EQ(Run("select * from w", 0), 0);
     ub4 position = 0;
     const struct { ub4 shown; ub2 size, set; ub1 form; } columns[] = {
         {31, 11, 0, 0}, {8, 5, 0, 0}, {22, 11, 0, 0}, {15, 11, 0, 0}, {20, 10, 0, 0}, {28, 28, 873, SQLCS_NCHAR},
-        {4000, 4000, 873, 1}, {4000, 4000, 873, 1}, {4000, 4000, 873, 1}};
+        {4000, 4000, 873, 1}, {4000, 4000, 873, 1}, {4000, 4000, 873, 1}, {9, 7, 0, 0}, {40, 22, 0, 0}, {40, 4, 0, 0},
+        {31, 11, 0, 0}};
     for (const auto& c : columns) {
         ASSERT_EQ(Member(stmt_, &item, ++position, OCI_HTYPE_STMT), 0);
         EXPECT_EQ(Attribute<ub4>(item, OCI_DTYPE_PARAM, OCI_ATTR_DISP_SIZE), c.shown) << position;
@@ -313,6 +317,8 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     for (const ub4 position : {0u, 4u, kHuge}) EXPECT_EQ(Member(columns, &again, position), 24334) << position;
     EXPECT_EQ(Member(columns, nullptr, 1), 21560);
     EXPECT_EQ(Member(root, &again, 1), 24334) << "no list";
+    ASSERT_EQ(OCIDescriptorAlloc(env_, &again, OCI_DTYPE_PARAM, 0, nullptr), OCI_SUCCESS);
+    EXPECT_EQ(Member(again, &again, 1), 24334) << "of nothing";
     EXPECT_EQ(Member(root, &again, 1, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
     EXPECT_EQ(Member(describe, &again, 1, OCI_HTYPE_SERVER), 24316);
     MUST(Run("drop view v", 1), Run("drop table t", 1));

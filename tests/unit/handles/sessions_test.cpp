@@ -230,6 +230,8 @@ TEST_F(Sessions, AttachedDetachedAndAskedByThreads) {
             }
         }
     });
+    OCIServerAttach(server, err_, Text("here"), 4, 0);
+    EXPECT_STREQ(Attribute<const char*>(server, OCI_HTYPE_SERVER, OCI_ATTR_DBNAME), "here");
 }
 
 TEST_F(Sessions, OfOneServerBegunAndEndedByThreads) {

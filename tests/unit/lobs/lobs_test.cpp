@@ -251,6 +251,11 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
     Temporary(other);
     MUST(Write(other, 1, "12\xC3\xB6" "4"), Answer(OCILobCopy(svc, err, lob, other, 100, 3, 2)));
     EXPECT_EQ(Read(lob), "11:h\xC3\xA4" "2\xC3\xB6" "4 world");
+    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 9, 11, 4)), 0);    // the last one
+    EXPECT_EQ(Read(lob, 9, 9), "3:rl4");
+    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, lob, 1, 11, 10)), 0);
+    EXPECT_EQ(Read(lob, 9, 9), "3:rll");
+    EXPECT_EQ(Write(lob, 11, "d"), 0);
     EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, lob, 5, 2, 1)), 0);    // onto itself
     EXPECT_EQ(Read(lob), "11:hh\xC3\xA4" "2\xC3\xB6" "4world");
     EXPECT_EQ(Answer(OCILobAppend(svc, err, other, other)), 0);
@@ -363,6 +368,7 @@ TEST_F(Lobs, OpeningIsPerTransaction) {
     EXPECT_EQ(open, TRUE);
     EXPECT_EQ(Prepare("commit"), 0);
     EXPECT_EQ(ExecuteCode(), OCI_SUCCESS_WITH_INFO);
+    EXPECT_EQ(Answer(OCI_ERROR), 22297);
     EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 22289);
 }
 
@@ -393,8 +399,22 @@ TEST_F(Lobs, BufferedWritesWait) {
     EXPECT_EQ(Write(lob, 1, std::string(600000, 'x')), 22280);
     EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, 9)), 24801);
     EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_FREE)), 0);
+    SHOULD(Write(lob, 3, "B"), Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_NOFREE)), Write(lob, 1, "J"));
     EXPECT_EQ(Answer(OCILobDisableBuffering(svc, err, lob)), 0);
-    EXPECT_EQ(Stored(), "HAllo world");
+    EXPECT_EQ(Stored(), "JABlo world");
+}
+
+// What one locator knows of the places of characters is nothing once another has written.
+TEST_F(Lobs, TwoLocatorsOfOneValue) {
+    Fetch(lob);
+    Fetch(other);
+    EXPECT_EQ(Write(lob, 1, "x"), 0);
+    EXPECT_EQ(Read(other, 2, 4) + std::to_string(LengthOf(other)), "2:lo11");
+    EXPECT_EQ(Write(lob, 1, "\xC3\xB6"), 0);
+    EXPECT_EQ(Read(other, 2, 4) + std::to_string(LengthOf(other)), "2:lo11");
+    EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 5)), 0);
+    EXPECT_EQ(Read(other, 9, 4) + std::to_string(LengthOf(other)), "2:lo5");
+    EXPECT_EQ(Stored(), "\xC3\xB6\xC3\xA4llo");
 }
 
 TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
