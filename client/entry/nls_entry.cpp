@@ -55,7 +55,7 @@ constexpr TextItem kTextItems[] = {
 
 std::string Capitalized(std::string_view name) {
     std::string text(name);
-    if (!text.empty() && text[0] >= 'a' && text[0] <= 'z') text[0] = static_cast<char>(text[0] - 'a' + 'A');
+    text.front() = date::ToUpper(text.front());
     return text;
 }
 

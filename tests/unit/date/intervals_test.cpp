@@ -115,38 +115,19 @@ TEST_F(IntervalCalls, PartsHaveLimitsAndOneSign) {
     EXPECT_EQ(Shown(copy, 1), "-3-11");
 }
 
-TEST_F(IntervalCalls, WhatIsMissingOrUnset) {
+TEST_F(IntervalCalls, WhatIsUnset) {
     OCIInterval *days = Read("1"), *months = Read("1-2", true);
     OCIDateTime* moment = Moment("2024-07-15 00:00:00 -03:30");
     auto* unset = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
     auto* none = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     sb4 part[5];
-    sb1 offset = 0;
-    ub1 text[40];
-    ub4 size = sizeof text, flags = 7;
-    size_t length = 0;
-    const sb4 answers[][2] = {
-        {Answer(OCIDateTimeFromText(env_, err_, nullptr, 1, nullptr, 0, nullptr, 0, moment)), 21560},
-        {Answer(OCIDateTimeToText(env_, err_, moment, nullptr, 0, 9, nullptr, 0, nullptr, text)), 21560},
-        {Answer(OCIDateTimeToText(env_, err_, moment, nullptr, 0, 9, nullptr, 0, &size, nullptr)), 21560},
-        {Answer(OCIDateTimeToText(env_, err_, unset, nullptr, 0, 9, nullptr, 0, &size, text)), 1866},
-        {Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, moment, nullptr, &offset)), 21560},
-        {Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, moment, &offset, nullptr)), 21560},
-        {Answer(OCIDateTimeGetTimeZoneName(env_, err_, moment, text, nullptr)), 21560},
-        {Answer(OCIIntervalGetDaySecond(env_, err_, nullptr, part, part, part, part, days)), 21560},
-        {Answer(OCIIntervalGetDaySecond(env_, err_, part, part, part, part, nullptr, days)), 21560},
-        {Answer(OCIIntervalGetDaySecond(env_, err_, part, part, part, part, part, months)), 1867},
-        {Answer(OCIIntervalGetYearMonth(env_, err_, part, nullptr, months)), 21560},
-        {Answer(OCIIntervalFromText(env_, err_, nullptr, 1, days)), 21560},
-        {Answer(OCIIntervalToText(env_, err_, days, 2, 0, nullptr, 9, &length)), 21560},
-        {Answer(OCIIntervalToText(env_, err_, days, 2, 0, text, 9, nullptr)), 21560},
-        {Answer(OCIIntervalCompare(env_, err_, days, days, nullptr)), 21560},
-        {Answer(OCIIntervalCheck(env_, err_, days, nullptr)), 21560},
-        {Answer(OCIIntervalCheck(env_, err_, none, &flags)), 1867},
-        {Answer(OCIDateTimeSubtract(env_, err_, unset, moment, none)), 1866},
-        {Answer(OCIDateTimeSubtract(env_, err_, moment, unset, none)), 1866},
-        {Answer(OCIIntervalCheck(env_, err_, days, &flags)), 0}};
-    for (const auto& answer : answers) EXPECT_EQ(answer[0], answer[1]) << &answer - answers;
+    ub4 flags = 7;
+    EXPECT_EQ(Shown(unset, ""), "1866");
+    EXPECT_EQ(Answer(OCIIntervalGetDaySecond(env_, err_, part, part, part, part, part, months)), 1867);
+    EXPECT_EQ(Answer(OCIIntervalCheck(env_, err_, none, &flags)), 1867);
+    EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, unset, moment, none)), 1866);
+    EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, moment, unset, none)), 1866);
+    EXPECT_EQ(Answer(OCIIntervalCheck(env_, err_, days, &flags)), 0);
     EXPECT_EQ(flags, 0u);
 }
 
@@ -180,7 +161,6 @@ TEST_F(IntervalCalls, SumsCarryAndCompare) {
     auto* stamp = reinterpret_cast<OCIInterval*>(NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP));
     for (const OCIInterval* none : {Bogus<OCIInterval>(), stamp})
         EXPECT_EQ(OCIIntervalAssign(env_, err_, none, months), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Answer(OCIIntervalAssign(env_, err_, months, nullptr)), 21560);
 }
 
 TEST_F(IntervalCalls, MomentsMove) {

@@ -330,6 +330,11 @@ TEST_F(CallsTest, PasswordChange) {
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012) << "nor is the session left";
     EXPECT_EQ(change(other, "zoe", "three", "four", OCI_AUTH), 0);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 0) << "the change has begun a session";
+    OraText* name = nullptr;
+    ub4 size = 0;
+    auto* session = Attribute<OCISession*>(other, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
+    EXPECT_EQ(Answer(OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &size, OCI_ATTR_USERNAME, err_)), 0);
+    EXPECT_EQ(std::string_view(reinterpret_cast<char*>(name), size), "zoe");
     SHOULD(change(other, "ZOE", "four", "five", 0), Answer(OCILogoff(other, err_)));
 }
 

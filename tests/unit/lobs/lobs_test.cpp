@@ -433,6 +433,7 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     EXPECT_EQ(Answer(OCILobCreateTemporary(svc, err, other, 9999, 0, OCI_TEMP_CLOB, TRUE, OCI_DURATION_SESSION)), 24329);
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &length, 1, room, 9, nullptr, nullptr, 0, 3)), 24815);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
+    EXPECT_EQ(Answer(OCILobGetChunkSize(svc, err, lob, nullptr)), 21560);
     EXPECT_EQ(Answer(OCILobErase(svc, err, lob, nullptr, 1)), 21560);
     EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, nullptr, nullptr, 1, room, 9, 0, nullptr, nullptr, 0, 0)), 21560);
     EXPECT_EQ(Read(lob, 4, 0) + Read(lob, 4, kPast) + Read(lob, 4, 1, 0), "!24801!100!24803");

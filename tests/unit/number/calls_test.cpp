@@ -84,8 +84,6 @@ TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
     size = static_cast<ub4>(-1);
     EXPECT_EQ(write(&size, text), OCI_ERROR);
     EXPECT_EQ(Recorded(), 21560);
-    EXPECT_EQ(OCINumberAbs(error_, &value, nullptr), OCI_ERROR);
-    EXPECT_EQ(Recorded(), 21560);
     const OCINumber* values[] = {&value, nullptr};
     double reals[2] = {};
     EXPECT_EQ(OCINumberToRealArray(error_, values, 2, 8, reals), OCI_ERROR);
@@ -94,11 +92,8 @@ TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
     const auto answer = [&](sword code) { return code == OCI_ERROR ? Recorded() : code; };
     OCINumber other{};
     size = sizeof text;
-    const sb4 missing[] = {
-        answer(OCINumberFromReal(error_, reals, 8, nullptr)), answer(OCINumberFromReal(error_, reals, 3, &other)),
-        answer(OCINumberToReal(error_, &value, 3, reals)), answer(OCINumberToRealArray(error_, values, 1, 8, nullptr)),
-        answer(OCINumberToText(error_, nullptr, nullptr, 0, nullptr, 0, &size, text))};
-    for (const sb4& number : missing) EXPECT_EQ(number, 21560) << &number - missing;
+    EXPECT_EQ(answer(OCINumberFromReal(error_, reals, 3, &other)), 21560);
+    EXPECT_EQ(answer(OCINumberToReal(error_, &value, 3, reals)), 21560);
     OCINumberSetZero(error_, &other);
     EXPECT_EQ(other.OCINumberPart[1], 128);
     const OCINumber small = Number("255");
@@ -114,7 +109,8 @@ TEST_P(NumberCalls, TextsInTheFormOfTheEnvironment) {
     EXPECT_EQ(FromText(Bytes("1"), Bytes("Q"), &result), OCI_ERROR);
     EXPECT_EQ(Recorded(), 22061);
     if (Utf16()) {
-        EXPECT_EQ(FromText(std::string("\x00\xDC", 2), Bytes("9"), &result), OCI_ERROR);
-        EXPECT_EQ(Recorded(), 24501);
+        const std::string half("\x00\xDC", 2);
+        EXPECT_EQ(answer(FromText(half, Bytes("9"), &result)), 24501);
+        EXPECT_EQ(answer(FromText(Bytes("1"), half, &result)), 24501);
     }
 }

@@ -59,12 +59,6 @@ TEST_F(StringCalls, RefuseWhatIsNoString) {
         EXPECT_EQ(OCIStringSize(env_, wrong), 0u);
         EXPECT_EQ(target, wrong);
     }
-    EXPECT_EQ(Answer(OCIStringAssignText(env_, err_, Text("y"), 1, nullptr)), 21560);
-    EXPECT_EQ(Answer(OCIStringResize(env_, err_, 0, nullptr)), 21560);
-    EXPECT_EQ(Answer(OCIStringAllocSize(env_, err_, nullptr, &size)), 21560);
-    EXPECT_EQ(Answer(OCIStringAllocSize(env_, err_, string, nullptr)), 21560);
-    EXPECT_EQ(OCIStringAssignText(nullptr, err_, Text("y"), 1, &string), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIStringAssignText(env_, nullptr, Text("y"), 1, &string), OCI_INVALID_HANDLE);
     EXPECT_EQ(OCIStringPtr(nullptr, string), nullptr);
     EXPECT_EQ(OCIRawSize(nullptr, raw), 0u);
 }
