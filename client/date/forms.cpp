@@ -1,5 +1,6 @@
 // The forms of a date that need no model: OCIDate, the seven bytes, the engines' text.
 #include "date/date.h"
+#include "platform/letters.h"
 #include "handles/errors.h"
 #include "oci_types.h"
 
@@ -44,14 +45,7 @@ public:
     }
 
     // One to `most` digits.
-    bool Number(std::size_t most, int* value) {
-        std::size_t count = 0;
-        for (*value = 0; count < text_.size() && count < most && IsDigit(text_[count]); ++count) {
-            *value = *value * 10 + (text_[count] - '0');
-        }
-        text_.remove_prefix(count);
-        return count > 0;
-    }
+    bool Number(std::size_t most, int* value) { return letters::TakeDigits(text_, most, value) > 0; }
 
     bool SmallNumber(std::uint8_t* value) {
         int number = 0;
@@ -62,17 +56,15 @@ public:
 
     // Any number of digits; what is below a nanosecond is dropped.
     bool Fraction(std::uint32_t* nanosecond) {
-        std::size_t count = 0;
+        const std::size_t before = text_.size();
         std::uint32_t place = 100'000'000;
-        for (*nanosecond = 0; count < text_.size() && IsDigit(text_[count]); ++count, place /= 10) {
-            *nanosecond += place * static_cast<std::uint32_t>(text_[count] - '0');
+        for (*nanosecond = 0; !text_.empty() && letters::IsDigit(text_.front()); text_.remove_prefix(1), place /= 10) {
+            *nanosecond += place * static_cast<std::uint32_t>(text_.front() - '0');
         }
-        text_.remove_prefix(count);
-        return count > 0;
+        return text_.size() < before;
     }
 
 private:
-    static bool IsDigit(char c) { return c >= '0' && c <= '9'; }
     std::string_view text_;
 };
 

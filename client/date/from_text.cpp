@@ -133,23 +133,20 @@ private:
     }
 
     std::size_t CountDigits(std::size_t most) const {
-        std::size_t count = 0;
-        while (count < rest_.size() && count < most && letters::IsDigit(rest_[count])) ++count;
-        return count;
+        int value = 0;
+        std::string_view ahead = rest_;
+        return letters::TakeDigits(ahead, most, &value);
     }
 
     // How many digits belong to a number. A short year takes four when just four stand there and no number follows.
     std::size_t DigitsOf(const Element& element) const {
-        const std::size_t width = element.width;
-        const bool short_year = SlotOf(element.field) == Field::year && width < 4;
-        if (short_year && !exact_ && CountDigits(5) == 4 && !Following().numeric) return 4;
-        return CountDigits(width);
+        const bool year = SlotOf(element.field) == Field::year;
+        return year && !exact_ && CountDigits(5) == 4 && !Following().numeric ? 4 : CountDigits(element.width);
     }
 
     int TakeDigits(std::size_t count) {
         int value = 0;
-        for (std::size_t i = 0; i < count; ++i) value = value * 10 + (rest_[i] - '0');
-        rest_.remove_prefix(count);
+        letters::TakeDigits(rest_, count, &value);
         return value;
     }
 

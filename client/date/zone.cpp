@@ -210,24 +210,14 @@ Errno MoveSeconds(std::int64_t seconds, DateTime* value) {
     return 0;
 }
 
-// One or two digits, from the left.
-bool TakeNumber(std::string_view& text, int* value) {
-    std::size_t count = 0;
-    for (*value = 0; count < text.size() && count < 2 && letters::IsDigit(text[count]); ++count) {
-        *value = *value * 10 + (text[count] - '0');
-    }
-    text.remove_prefix(count);
-    return count > 0;
-}
-
 Errno SetWrittenOffset(std::string_view text, DateTime* value) {
     const bool west = text.front() == '-';
     text.remove_prefix(1);
     int hours = 0, minutes = 0;
-    if (!TakeNumber(text, &hours)) return errors::kNoZone;
+    if (letters::TakeDigits(text, 2, &hours) == 0) return errors::kNoZone;
     if (text.starts_with(':')) {
         text.remove_prefix(1);
-        if (!TakeNumber(text, &minutes)) return errors::kNoZone;
+        if (letters::TakeDigits(text, 2, &minutes) == 0) return errors::kNoZone;
     }
     return text.empty() ? SetOffset(west, hours, minutes, value) : errors::kNoZone;
 }

@@ -45,14 +45,7 @@ private:
         return true;
     }
 
-    bool Number(int* value) {
-        std::size_t count = 0;
-        for (*value = 0; count < rest_.size() && count < 4 && letters::IsDigit(rest_[count]); ++count) {
-            *value = *value * 10 + (rest_[count] - '0');
-        }
-        rest_.remove_prefix(count);
-        return count > 0;
-    }
+    bool Number(int* value) { return letters::TakeDigits(rest_, 4, value) > 0; }
 
     bool Name(std::string* name) {
         const bool bracketed = Take('<');

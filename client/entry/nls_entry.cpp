@@ -55,7 +55,7 @@ constexpr TextItem kTextItems[] = {
 
 std::string Capitalized(std::string_view name) {
     std::string text(name);
-    text.front() = date::ToUpper(text.front());
+    text.front() = letters::ToUpper(text.front());
     return text;
 }
 

@@ -88,7 +88,7 @@ void PutWhole(const Job& job, Writer* out) {
     bool started = false;
     const auto put_place = [&](bool last_when_zero) {
         --place;
-        started = started || place < job.decimal.point || place < model.zeros_before || (last_when_zero && place == 0);
+        started = place < job.decimal.point || place < model.zeros_before || (last_when_zero && place == 0);
         if (started) out->Put(job.Digit(place));
     };
     const bool units_zero = PlacesShown(job) == 0 || model.point == 'V';

@@ -34,6 +34,19 @@ constexpr bool EqualFolded(std::string_view left, std::string_view right) {
     return left.size() == right.size() && StartsWithFolded(left, right);
 }
 
+// Takes up to `most` digits off the front of a text; how many, and their value.
+constexpr std::size_t TakeDigits(std::string_view& text, std::size_t most, int* value) {
+    std::size_t count = 0;
+    *value = 0;
+    for (const char c : text.substr(0, most)) {
+        if (!IsDigit(c)) break;
+        *value = *value * 10 + (c - '0');
+        ++count;
+    }
+    text.remove_prefix(count);
+    return count;
+}
+
 constexpr std::string_view WithoutLeadingBlanks(std::string_view text) {
     const std::size_t first = text.find_first_not_of(' ');
     return first == std::string_view::npos ? std::string_view() : text.substr(first);

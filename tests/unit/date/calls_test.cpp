@@ -161,7 +161,9 @@ TEST_F(DateCalls, AssignmentKeepsTheTypesParts) {
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, time)), 0);
     EXPECT_EQ(TimeOf(time), "13:14:15.5");
     EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, time, stamp)), 1878);
-    SHOULD(Answer(OCIDateTimeAssign(env_, err_, time, time)), Answer(OCIDateTimeAssign(env_, err_, zoned, zoned)));
+    SHOULD(Answer(OCIDateTimeAssign(env_, err_, time, time)), Answer(OCIDateTimeAssign(env_, err_, zoned, zoned)),
+           Answer(OCIDateTimeAssign(env_, err_, stamp, zoned)),
+           Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, zoned, &hour, &minute)));
 }
 
 TEST_F(DateCalls, ComparisonCrossesZones) {
