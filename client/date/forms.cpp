@@ -1,8 +1,8 @@
 // The forms of a date that need no model: OCIDate, the seven bytes, the engines' text.
 #include "date/date.h"
-#include "platform/letters.h"
 #include "handles/errors.h"
 #include "oci_types.h"
+#include "platform/letters.h"
 
 namespace date {
 namespace {
