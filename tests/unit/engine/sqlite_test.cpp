@@ -287,6 +287,8 @@ TEST_F(Sqlite, ErrorsHaveTheirNumbers) {
     ASSERT_EQ(Run("insert into late values(77)"), 0);
     EXPECT_EQ(connection_->Commit().Number(), 2091) << "a deferred constraint undoes the transaction";
     EXPECT_FALSE(connection_->InTransaction());
+    Rows none;
+    EXPECT_EQ(Prepared("select abs(-9223372036854775807 - 1)")->Open(none, {}).Detail(), "integer overflow") << "nothing is lost";
 }
 
 TEST_F(Sqlite, RefusedValueNamesItsColumn) {

@@ -236,6 +236,19 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
 }
 
+// A locator that was not fetched to be written shows what was there, or nothing any more.
+TEST_F(Lobs, ValuesThatAreTrimmedAreOthers) {
+    if (OnServer()) return;    // which keeps what was there
+    for (const ub4 length : {11u, 10u, 0u}) {
+        Fetch(other, "select c from l");
+        Fetch(lob);
+        MUST(Answer(OCILobTrim(svc, err, lob, length)));
+        EXPECT_EQ(Read(other), length == 11 ? "11:h\xC3\xA4llo world" : "!22924") << length;
+        EXPECT_EQ(LengthOf(lob), length);
+        MustRun("rollback");
+    }
+}
+
 TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
     MustRun("create table n(k integer, c clob)", "insert into n values(1, '" + std::string(50000, 'a') + "')",
             "insert into n values(2, '" + std::string(50000, 'b') + "')");
@@ -332,7 +345,9 @@ TEST_F(Lobs, EmptyOnesOfTheApplication) {
 
 TEST_F(Lobs, BindsAndReturningTakeLocators) {
     Temporary(lob);
-    MUST(Write(lob, 1, "by bind"), Ready("insert into l(k, c) values(2, :1)", {Locator(lob)}), Execute());
+    MUST(Write(lob, 1, "by bind"), Ready("insert into l(k, b) values(2, :1)", {Locator(lob, SQLT_BLOB)}));
+    EXPECT_EQ(Execute(), 932);
+    MUST(Ready("insert into l(k, c) values(2, :1)", {Locator(lob)}), Execute());
     MUST(Ready("insert into l(k, c) values(3, empty_clob()) returning c into :1", {Locator(other)}), Execute());
     EXPECT_EQ(Write(other, 1, "returned"), 0);
     EXPECT_EQ(One("select group_concat(c, '|') from l where k > 1"), "by bind|returned");

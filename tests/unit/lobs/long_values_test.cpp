@@ -135,7 +135,8 @@ TEST_F(LongValues, ComeBackWholeFromEachKindOfTable) {
         EXPECT_EQ(GivePieces(kLength), OCI_SUCCESS) << Answer(OCI_ERROR);
         EXPECT_EQ(One("select count(*) from t"), "1");
         MustRun("commit");
-        EXPECT_EQ(TakePieces("select c from t", c.type), kLength);
+        for (const char* rows : {"select c from t", "select c from t, (select 1 as one from dual) o"})
+            EXPECT_EQ(TakePieces(rows, c.type), kLength);
         // From its locator into another row, which shows in the same table's other rows and nowhere else.
         ASSERT_EQ(Query("select c from t", {Locator(lob, c.locator)}), 0);
         MUST(Ready("insert into t(k, c) values(2, :v)", {Locator(lob, c.locator)}), Execute());

@@ -152,7 +152,7 @@ TEST(SqlText, WhatTheTextTellsToBeWrong) {
         {"begin open :c for select 1 end;", 6550, 31}, {"begin if x then null; end if; end;", 6550, 6},
         {"begin open :c for ; end;", 6550, 6}, {"begin select 1 from t; end;", 6550, 6},
         {"begin null; end; select 1", 6550, 17}, {"begin null;", 6550, 11},
-        {"declare x number; begin null; end;", 6550, 0}, {"begin end;", 6550, 0}, {"begin explain select 1; end;", 6550, 6},
+        {"declare x number; begin null; end;", 6550, 0}, {"begin end;", 6550, 0}, {"begin explain select 1; end;", 6550, 6}, {"begin x := 1; end;", 6550, 6},
     };
     for (const auto& c : cases) {
         const sql::StatementText statement = sql::Scan(c.text);

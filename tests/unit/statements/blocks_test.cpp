@@ -121,6 +121,11 @@ TEST_F(Blocks, TablesAtTheirLimits) {
     ASSERT_EQ(Prepare("begin select a, a into :1, :2 from t order by a; end;"), 0);
     ASSERT_EQ(Bind(1, Int(wide), OCI_DEFAULT, 4, &(current = 0)) + Bind(2, Int(plain)), 0);
     EXPECT_EQ(Execute(), 1414);
+    sb4 by_row[2] = {};
+    ASSERT_EQ(Prepare("begin select a, a into :1, :2 from t where a = 2; end;"), 0);
+    ASSERT_EQ(Bind(1, Int(wide), OCI_DEFAULT, 4, &(current = 0)) + Bind(2, Int(by_row)), 0);
+    EXPECT_EQ(Execute(2), 0);
+    EXPECT_EQ(by_row[0] * 10 + by_row[1], 22);
     ub4 shorter = 2;
     current = 3;
     ASSERT_EQ(Prepare("begin insert into t values(:1 + :2); end;"), 0);
@@ -168,6 +173,9 @@ TEST_F(Blocks, RowsReturnedByTheLastExecution) {
         ASSERT_EQ(Execute(execution + 1, OCI_DEFAULT, execution), 0);
         EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), execution == 0 ? 2u : 0u);
     }
+    ASSERT_EQ(Prepare("begin update t set a = a + 0 where a = 3 returning a into :b; end;") + BindName(&bind, "b", Int(out)), 0);
+    EXPECT_EQ(Execute(), 0);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), 1u);
     // The last that succeeds, whatever fails behind it.
     const struct { std::array<sb4, 3> in; ub4 mode; sb4 answer; ub4 returned; } cases[] = {
         {{7, 8, 7}, OCI_BATCH_ERRORS, 24381, 1}, {{7, 7, 7}, OCI_BATCH_ERRORS, 24381, 1},

@@ -217,6 +217,11 @@ TEST_F(Executing, BlockOpensResultSets) {
         EXPECT_EQ(OCIHandleFree(stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
         stmt = block;
     }
+    for (void* wrong : {static_cast<void*>(this), static_cast<void*>(env), static_cast<void*>(stmt)}) {
+        ASSERT_EQ(Prepare("begin open :c for select a from t; end;"), 0);
+        MUST(BindName("c", {&wrong, 8, SQLT_CUR}));
+        EXPECT_EQ(Execute(), 24336) << "neither null nor another statement";
+    }
 }
 
 // What the server says besides comes with a success, in its order; behind a truncation, which is told first.
