@@ -36,7 +36,7 @@ int FromUtf16(const void* text, size_t length, std::string& output) {
     size_t unused = 0;
     const int rc = CodePageConvert(kCodePageUtf16, EffectiveCodePage(), text, length, nullptr, output.data(),
                                    output.size(), &unused);
-    output.resize(IsTolerated(rc) ? output.size() - std::min(unused, output.size()) : 0);
+    output.resize(output.size() - unused);
     return rc;
 }
 

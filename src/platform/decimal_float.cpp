@@ -86,17 +86,15 @@ private:
 };
 
 bool ReadExponent(std::string_view text, int& exponent) {
-    if (!text.empty() && text[0] == '+') text.remove_prefix(1);
+    if (text.starts_with('+')) text.remove_prefix(1);
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), exponent);
     constexpr int kSane = 1000000;
     return error == std::errc() && end == text.data() + text.size() && exponent > -kSane && exponent < kSane;
 }
 
 bool ReadParts(std::string_view text, const Format& format, Parts& value) {
-    if (!text.empty() && (text[0] == '-' || text[0] == '+')) {
-        value.negative = text[0] == '-';
-        text.remove_prefix(1);
-    }
+    value.negative = text.starts_with('-');
+    if (value.negative || text.starts_with('+')) text.remove_prefix(1);
     const size_t mark = text.find_first_of("eE");
     DigitReader digits(format);
     int exponent = 0;

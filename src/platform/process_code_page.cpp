@@ -37,11 +37,10 @@ int GetProcessCodePage(std::uint32_t* first, std::uint32_t* second) {
     const std::string_view pair = setting;
     const std::size_t comma = pair.find(',');
     const std::string_view second_word = comma == pair.npos ? pair : pair.substr(comma + 1);
-    std::uint32_t numbers[2];
-    const bool read = ReadNumber(pair.substr(0, comma), numbers[0]) && ReadNumber(second_word, numbers[1]);
-    if (!read) return kCodePageBadArgument;
-    if (!FindCodePage(numbers[0]) || !FindCodePage(numbers[1])) return kCodePageUnknown;
-    *first = numbers[0];
-    *second = numbers[1];
+    std::uint32_t one, other;
+    if (!ReadNumber(pair.substr(0, comma), one) || !ReadNumber(second_word, other)) return kCodePageBadArgument;
+    if (!FindCodePage(one) || !FindCodePage(other)) return kCodePageUnknown;
+    *first = one;
+    *second = other;
     return kCodePageDone;
 }

@@ -203,9 +203,9 @@ size_t PieceList::LongestPiece() const {
     return longest;
 }
 
-const char* PieceName(ub1 piece) {
+const char* PieceName(ub1 piece) {    // one of these four
     constexpr const char* kNames[] = {"OCI_ONE_PIECE", "OCI_FIRST_PIECE", "OCI_NEXT_PIECE", "OCI_LAST_PIECE"};
-    return piece < std::size(kNames) ? kNames[piece] : "Invalid";
+    return kNames[piece];
 }
 
 void PrintWritten(ub4 length, ub1 piece) {
@@ -267,7 +267,7 @@ sword Write::Send(const LobHandles& handles) {
 
 void Write::Copy(const MemBuffer& buffer) {
     length_ = PieceLength(buffer);
-    if (area_ != nullptr && length_ > 0) std::memcpy(area_.get(), buffer.Element(0), length_);
+    if (area_ != nullptr) std::copy_n(buffer.Element(0), length_, area_.get());
 }
 
 // What kind of piece the first one is, the script has said.

@@ -23,13 +23,14 @@ struct Element {
     uint16_t length = 7, return_code = 0;
     uint16_t precision = 0;
     int16_t scale = 0;
+    bool assigned = false;
 
     Element(int type, uint32_t size) : type(type), size(size) { std::memset(data, 0xEE, sizeof data); }
 
     // What is printed; the guard must not have been touched.
     std::string Assign(const char* word, long given) {
         const ElementTarget target = {type, data, size, &indicator, &length, &return_code, precision, scale};
-        const std::string printed = Printed([&] { AssignText(target, word, given); });
+        const std::string printed = Printed([&] { assigned = AssignText(target, word, given); });
         for (size_t index = size; index < sizeof data; ++index) EXPECT_EQ(data[index], 0xEE) << word << " at " << index;
         return printed;
     }
@@ -59,7 +60,8 @@ TEST(Values, TextsStoredAndShown) {
         {SQLT_FLT, 16, "0.25", 16, 16, "0.250000\n"},
         {SQLT_DAT, 7, "2024-02-29-13:05:00", 7, 7, "\"2024-02-29-13:05:00\"\n"},
         {SQLT_DAT, 7, "2023-02-29-13:05:00", 7, 7, "Invalid date found\n"},
-        {SQLT_DAT, 7, "2024-12-31", 7, 7, "\"2024-12-31-00:00:00\"\n"},
+        {SQLT_DAT, 7, "2000-12-31", 7, 7, "\"2000-12-31-00:00:00\"\n"}, {SQLT_BIN, 5, "X'", 2, 2, "\"5827\"\n"},
+        {SQLT_BIN, 5, "X''", 3, 0, "\"\"\n"},
         {SQLT_DAT, 3, "2024-12-31", 7, 7, "Invalid date found\n"},
         {SQLT_ODT, 8, "1999-01-02-03:04:60", 8, 8, "1999-01-02-03:04:60\n"},
         {SQLT_ODT, 8, "1999-01-02-03:04:61", 8, 8, "1999-01-02-03:04:61\nInvalid OCITimeSS - 61\n"}};
@@ -67,7 +69,7 @@ TEST(Values, TextsStoredAndShown) {
         Element element(c.type, c.size);
         EXPECT_EQ(element.Assign(c.word, c.given), "") << c.type << " " << c.word;
         EXPECT_EQ(element.length, c.length) << c.type << " " << c.word;
-        EXPECT_EQ(element.indicator, 0);
+        EXPECT_TRUE(element.assigned && element.indicator == 0) << c.type << " " << c.word;
         EXPECT_EQ(element.Show(), c.shown) << c.type << " " << c.word;
     }
 }
@@ -83,8 +85,7 @@ TEST(Values, AWordThatIsNoValueChangesNothing) {
         const std::string before = element.Bytes(sizeof element.data);
         EXPECT_EQ(element.Assign(c.word, 30), std::string("Invalid value - ") + c.word + "\n") << c.type;
         EXPECT_EQ(element.Bytes(sizeof element.data), before) << c.type << " " << c.word;
-        EXPECT_EQ(element.indicator, 7);
-        EXPECT_EQ(element.length, 7);
+        EXPECT_TRUE(!element.assigned && element.indicator == 7 && element.length == 7) << c.type << " " << c.word;
     }
 }
 
@@ -111,6 +112,9 @@ TEST(Values, BlanksInUtf16) {
     application_code_page = second_code_page = 1208;
     Utf16Mode = true;
     EXPECT_EQ(element.Assign("ab", 2), "convertToUTF16 succeeded - In length - 2, Out length - 4\n");
+    application_code_page = 77777;
+    EXPECT_EQ(element.Assign("cd", 2), "CodePageConvert failed with rc - 1\n");
+    EXPECT_FALSE(element.assigned);
     Utf16Mode = false;
     EXPECT_EQ(element.Bytes(8), std::string("a\0b\0 \0 \0", 8));
 }

@@ -117,7 +117,8 @@ TEST(NumberPlainText, Writes) {
 TEST(NumberDecimalFloat, KnownBytes) {
     const struct { const char* number; std::size_t size; std::uint64_t high, low; } cases[] = {
         {"1", 8, 0, 0x31C0000000000001}, {"-7.5", 8, 0, 0xB1A000000000004B},
-        {"9999999999999999", 8, 0, 0x6C7386F26FC0FFFF}, {"0", 8, 0, 0x31C0000000000000},
+        {"9999999999999999", 8, 0, 0x6C7386F26FC0FFFF}, {"-9999999999999999", 8, 0, 0xEC7386F26FC0FFFF},
+        {"0", 8, 0, 0x31C0000000000000},
         {"1", 16, 0x3040000000000000, 1}, {"-1E-130", 16, 0xAF3C000000000000, 1},
         {"9999999999999999999999999999999999", 16, 0x3041ED09BEAD87C0, 0x378D8E63FFFFFFFF}};
     for (const auto& c : cases) {
@@ -138,7 +139,8 @@ TEST(NumberDecimalFloat, RoundsToItsDigitsAndRefusesWhatIsNoNumber) {
     ASSERT_EQ(number::FromDecimalFloat(words, 8, &got), 0);
     EXPECT_EQ(got, Number("0.1234567890123457"));
     const struct { std::uint64_t bits; number::Errno error; } special[] = {{0x7800000000000000, 22053},   // infinity
-                   {0x7C00000000000000, 22060},  // NaN
+                   {0xF800000000000000, 22053},   // and below zero
+                   {0x7C00000000000000, 22060}, {0xFC00000000000000, 22060},  // NaN
                    {0x5FE0000000000001, 22053},   // 1E369
                    {0x0000000000000001, 22054},  // 1E-398
                    {0x6FFFFFFFFFFFFFFF, 0}};                  // a coefficient of more than 16 digits counts as 0

@@ -118,7 +118,8 @@ TEST(CodePages, UnknownPagesAndNullAreasAreRefused) {
     EXPECT_EQ(unused_input, 2u);
     EXPECT_EQ(unused_output, 4u);
     EXPECT_EQ(CodePageConvert(0, 1202, "ab", 2, nullptr, area, 4, nullptr), kCodePageUnknown);
-    EXPECT_EQ(CodePageConvert(1208, 1202, nullptr, 2, nullptr, area, 4, nullptr), kCodePageBadArgument);
+    EXPECT_EQ(CodePageConvert(1208, 1202, nullptr, 3, &unused_input, area, 4, nullptr), kCodePageBadArgument);
+    EXPECT_EQ(unused_input, 3u);
     EXPECT_EQ(CodePageConvert(1208, 1202, "ab", 2, nullptr, nullptr, 4, nullptr), kCodePageBadArgument);
     EXPECT_EQ(CodePageConvert(1208, 850, nullptr, 0, nullptr, nullptr, 0, nullptr), kCodePageDone);
 }

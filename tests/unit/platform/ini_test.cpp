@@ -38,7 +38,7 @@ protected:
         return content.str();
     }
     static std::string Read(const char* section, const char* key, std::size_t capacity = 100) {
-        std::vector<char> area(capacity);
+        std::vector<char> area(capacity, '?');
         const std::size_t length = IniReadString("kelpcli.ini", section, key, "none", area.data(), capacity);
         EXPECT_TRUE(length == capacity || area[length] == '\0');
         return std::string(area.data(), length);

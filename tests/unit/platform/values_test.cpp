@@ -24,7 +24,8 @@ using namespace std::string_literals;
 
 TEST(PackedDecimal, ToText) {
     const struct { std::string packed; unsigned precision; int scale; const char* text; int result; } cases[] = {
-        {"\x12\x34\x5D", 5, 2, "-123.45", 0}, {"\x12\x34\x5C", 5, 0, "12345", 0}, {"\x00\x00\x0D"s, 5, 2, "0.00", 0},
+        {"\x12\x34\x5D", 5, 2, "-123.45", 0}, {"\x12\x34\x0D", 5, 2, "-123.40", 0}, {"\x12\x34\x5C", 5, 0, "12345", 0},
+        {"\x00\x00\x0D"s, 5, 2, "0.00", 0},
         {"\x00\x00\x5B"s, 5, 2, "-0.05", 0}, {"\x01\x2F", 2, 2, "0.12", 0}, {"\x01\x2A", 2, 4, "0.0012", 0},
         {"\x12\x3E", 3, 3, "0.123", 0}, {"\x12\x3C", 3, -2, "12300", 0}, {"\x00\x0C"s, 3, -2, "0", 0},
         {"\x7C", 1, 0, "7", 0}, {"\xC", 0, 0, "0", 0}, {"\x12\x34\x59", 5, 2, "", kDecimalBadSign},
@@ -40,7 +41,7 @@ TEST(PackedDecimal, ToText) {
 TEST(PackedDecimal, ToTextOfEveryCapacity) {
     const std::string whole = "-123.45";
     for (std::size_t capacity = 0; capacity < 10; ++capacity) {
-        std::vector<char> area(capacity);
+        std::vector<char> area(capacity, '?');
         const unsigned char packed[] = {0x12, 0x34, 0x5D};
         const int result = DecimalToText(packed, 5, 2, area.data(), capacity);
         EXPECT_EQ(result, capacity > whole.size() ? kDecimalDone : kDecimalTooShort) << capacity;
@@ -51,7 +52,7 @@ TEST(PackedDecimal, ToTextOfEveryCapacity) {
 
 TEST(PackedDecimal, FromText) {
     const struct { const char* text; unsigned precision; int scale; std::string packed; } cases[] = {
-        {"-123.45", 5, 2, "\x12\x34\x5D"}, {" +1.5 ", 5, 2, "\x00\x15\x0C"s}, {"0.0", 5, 2, "\x00\x00\x0C"s},
+        {"-123.45", 5, 2, "\x12\x34\x5D"}, {"\t+1.5 ", 5, 2, "\x00\x15\x0C"s}, {"1.5", 1, 0, "\x2C"}, {"0.0", 5, 2, "\x00\x00\x0C"s},
         {"-0", 5, 2, "\x00\x00\x0C"s}, {"1.005", 3, 2, "\x10\x1C"}, {"-1.0049", 3, 2, "\x10\x0D"},
         {"9.995", 4, 2, "\x01\x00\x0C"s}, {".5", 1, 0, "\x1C"}, {"0.04", 1, 1, "\x0C"}, {"-0.04", 1, 1, "\x0C"},
         {"0.004", 1, 1, "\x0C"}, {"12e2", 4, 0, "\x01\x20\x0C"s}, {"1234e-2", 4, 2, "\x01\x23\x4C"},
