@@ -105,7 +105,7 @@ template <class Object> void ShowContents(const CommandRow& row, int, char** wor
     if (contents == nullptr) return MessageText(kOutput, Traits<Object>::kNullMessage);
     const ub4 size = Call(Traits<Object>::kSize, environment, object);
     Line line;
-    if (size == 0 || Traits<Object>::AddContents(line, contents, size)) line.Character('\n').Print();
+    if (Traits<Object>::AddContents(line, contents, size)) line.Character('\n').Print();
 }
 
 template <class Object> void ShowSize(const CommandRow& row, int, char** words) {

@@ -112,6 +112,7 @@ TEST(Values, BlanksInUtf16) {
     application_code_page = second_code_page = 1208;
     Utf16Mode = true;
     EXPECT_EQ(element.Assign("ab", 2), "convertToUTF16 succeeded - In length - 2, Out length - 4\n");
+    EXPECT_EQ(Element(SQLT_CHR, 8).Assign("", 0), "");
     application_code_page = 77777;
     EXPECT_EQ(element.Assign("cd", 2), "CodePageConvert failed with rc - 1\n");
     EXPECT_FALSE(element.assigned);

@@ -471,6 +471,8 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     oraub8 units = 0;
     EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, &far, &units, 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(far * 10 + units, 32u) << "bytes and characters";
+    SHOULD(Answer(OCILobRead2(svc, err, lob, &(far = 0), &(units = 9), 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)));
+    EXPECT_EQ(far * 10 + units, 54u) << "what fits, and no more of it";
     Fetch(other, "select b from l for update", SQLT_BLOB);
     EXPECT_EQ(Answer(OCILobRead2(svc, err, other, &(far = 9), &(units = 1), 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(far, 3u) << "of bytes no characters count";
