@@ -96,9 +96,7 @@ Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)),
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) column_.scale = kFloating;
     if (purpose == Purpose::store) return;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) column_.type = SQLT_NUM;
-    if (IsDateType(column_.type) || IsIntervalType(column_.type)) return;
     column_.size = column_.characters = 0;
-    column_.precision = 0;
     column_.scale = kFloating;
 }
 

@@ -249,13 +249,19 @@ void Names::NoteExcluded() {
     tables_.push_back(std::move(excluded));
 }
 
+// Behind the WITH that a query may begin with.
+std::size_t Names::MainQuery(std::size_t at) const {
+    while (at < pieces_.size() && !IsOneOf(At(at), {"select", "values"})) at = (At(at) == "(" ? operands_.Partner(at) : at) + 1;
+    return at;
+}
+
 // with NAME as (query), with NAME(a, b) as (query): the query opens at `open`.
 void Names::NoteWith(std::size_t open) {
     std::size_t at = open;
     while (at > 0 && IsOneOf(At(at - 1), {"materialized", "not"})) --at;
     if (at < 2 || !IsWord(At(at - 1), "as")) return;
     With with;
-    with.query = open + 1;
+    with.query = MainQuery(open + 1);
     at -= 2;
     if (At(at) == ")") {
         const std::size_t names = operands_.Partner(at);
@@ -276,7 +282,7 @@ void Names::ReadList(std::size_t at, std::size_t scope, bool is_target) {
         table.is_natural = IsNaturalJoin(at);
         table.is_target = is_target;
         if (is_query) {
-            table.query = at + 1;
+            table.query = MainQuery(at + 1);
             at = operands_.Partner(at) + 1;
         } else {
             at = ReadTableName(pieces_, at, table.table);

@@ -85,6 +85,7 @@ private:
     [[nodiscard]] bool TableHasIntervals(const TableName& table) const;
     bool QueryHasIntervals(std::size_t query);
     void ReadTables();
+    [[nodiscard]] std::size_t MainQuery(std::size_t at) const;
     void NoteExcluded();
     void NoteWith(std::size_t open);
     void ReadList(std::size_t at, std::size_t scope, bool is_target);

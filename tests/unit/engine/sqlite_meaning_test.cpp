@@ -47,10 +47,10 @@ protected:
     }
     void MakeTables() {
         MustRun("create table t(id integer, d date, c char(5), n number, r raw(2), v varchar2(9))");
-        MustRun("create table u(id integer, e timestamp, d varchar2(20), c varchar2(9), n number, f decfloat(16))");
+        MustRun("create table u(id integer, e timestamp, d varchar2(20), c varchar2(9), n number, f decfloat(16), g decfloat(34))");
         MustRun("insert into t values(1, '03-FEB-24', 'ab', 5, '0A', 'x ')");
         MustRun("insert into t values(2, '01-DEC-99', 'abc', 10, '0B', 'x')");
-        MustRun("insert into u values(1, '03-FEB-24 10.00.00 AM', '03-FEB-24', 'ab   ', 1, '1.500000000000000001')",
+        MustRun("insert into u values(1, '03-FEB-24 10.00.00 AM', '03-FEB-24', 'ab   ', 1, '1.500000000000000001', 1.5)",
                 "create table few(id integer, n number)", "insert into few values(1, 5)",
                 "create view part as select id, n, d from t");
     }
@@ -64,6 +64,7 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
         {"select id from t where d not between '01-JAN-00' and %", "31-DEC-20", "1;2;"},
         {"select id from t where c not in (%)", "ab ", "2;"}, {"select id from t where c <> %", "abc     ", "1;"},
         {"select id from t where c < %", "abcdefgh", "1;2;"}, {"select id from u where f = %", "1.5", "1;"},
+        {"select id from u where g = %", "1.5", "1;"},
         {"select id from u where f < %", "1.500000000000000001", "1;"},
         {"select case d when % then 1 end as a, case v when 'x' then 2 end as b from t", "03-FEB-24", "1,-;-,2;"},
         {"select id from t where % = trunc(d) and (id = 1)", "03-FEB-24", "1;"},
@@ -135,6 +136,13 @@ TEST_F(SqliteMeaning, TextsAreComparedAsTheColumnsValues) {
          " select a from x where c = %", "03-FEB-24", "1;"},
         {"select id from (with x(i, y) as (select id, d from t) select i as id from x where y = %) union all"
          " select k from (with x(y, k) as (select c, 7 as k from t) select k from x where y = 'ab')", "03-FEB-24", "1;7;"},
+        {"select id from (with y as (select * from t), z as (select * from y) select id, d from z) x where x.d > %",
+         "31-JAN-24", "1;"},
+        {"with x(a, b) as (with y as (select * from t) select id, d from y) select a from x where b > %", "31-JAN-24",
+         "1;"},
+        {"with x as not materialized (select id, d from t) select id from x where d > %", "31-JAN-24", "1;"},
+        {"with x(a, b) as materialized (select id, d from t) select a from x where b > %", "31-JAN-24", "1;"},
+        {"with x(a, b) as (select 1, sysdate) select a from x where b > %", "31-JAN-24", "1;"},
         {"with u as (select id, d from t) select u.id from main.u where d = %", "03-FEB-24", "1;"},
         {"with x(a, b, c, e, f, g) as (select t.* from few join t using (id)) select a from x where b = %", "03-FEB-24",
          "1;"},

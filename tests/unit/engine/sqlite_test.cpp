@@ -99,7 +99,7 @@ TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
         MustRun("delete from t");
         const Datum bound = Text(std::string_view(literal).substr(1, literal.size() - 2));
         Rows twice{{bound}, {bound}};
-        EXPECT_EQ(outcome(Execute(*Prepared("insert into t(" + column + ") values(?1)"), twice)), want) << "bound " << literal;
+        EXPECT_EQ(outcome(Execute(*Prepared("insert into t(" + column + ") values(?1)"), twice, {0, 2})), want) << "bound " << literal;
     }
     OCINumber none;
     std::memset(&none, 0xFF, sizeof none);
@@ -347,12 +347,12 @@ TEST_F(Sqlite, TextThatIsNoDateStaysAText) {
 TEST_F(Sqlite, BoundMomentsAreWrittenAsTheirColumnsAre) {
     ASSERT_EQ(Run("create table t(d date, s timestamp(3), z timestamp_tz, v varchar2(40))"), 0);
     const date::DateTime zoned{.year = 2024, .month = 2, .day = 29, .hour = 1, .minute = 2, .second = 3, .has_zone = true,
-                               .zone_minutes = 90, .nanosecond = 123456789};
+                               .zone_minutes = 90, .nanosecond = 523456789};
     const date::DateTime time{.hour = 12, .minute = 30};
     ASSERT_EQ(Run("insert into t values(?1, ?2, ?3, ?4)", std::vector(4, Moment(zoned))), 0);
     EXPECT_EQ(Query("select d, s, z, v from t"),
-              "time 2024-02-29 01:02:03,time 2024-02-29 01:02:03.123,time 2024-02-29 01:02:03.123457 +01:30,"
-              "2024-02-29 01:02:03.123456789 +01:30;");
+              "time 2024-02-29 01:02:03,time 2024-02-29 01:02:03.523,time 2024-02-29 01:02:03.523457 +01:30,"
+              "2024-02-29 01:02:03.523456789 +01:30;");
     EXPECT_EQ(Query("select count(*) from t where z = ?1", {Moment(zoned)}), "0;") << "compared as it is";
     EXPECT_EQ(Run("insert into t(v) values(?1)", {Moment(time)}), 0);
     EXPECT_EQ(Query("select v from t where d is null"), "12:30:00;") << "a time alone";
