@@ -1202,13 +1202,16 @@ TEST_P(ServerObjects, AreMadeOfBytes) {
     ASSERT_EQ(Answer(lob->Read(0, std::as_writable_bytes(std::span(read)), count)), 0);
     EXPECT_EQ(read.substr(0, count), text.substr(19));
     MustRun("delete from o where k > 9");
+    std::vector<Datum> ten(9, Integer(1));
+    ten.push_back(View(Kind::bytes, "raw"));
     const struct { const char* sql; std::vector<Datum> values; const char* stored; } cases[] = {
         {"insert into o values(5, %1, %2)", {View(Kind::bytes, "raw"), View(Kind::bytes, "b")}, "5,raw,b;"},
         {"insert into o values(5, %1, %2)", {Text("6869"), Text("6A")}, "5,hi,j;"},    // digits
         {"insert into o values(5, %1, empty_blob())", {Null()}, "5,null,null;"},
         {"insert into o values(5, %1, '\\x6A'::bytea)", {View(Kind::bytes, "raw")}, "5,raw,j;"},
         {"insert into o(b, k, c) values(empty_blob(), 5, EMPTY_BLOB ( ))", {}, "5,null,null;"},
-        {"insert into o(k, c) select k + 2, c from o where k = 3", {}, "5,three,null;"}};
+        {"insert into o(k, c) select k + 2, c from o where k = 3", {}, "5,three,null;"},
+        {"insert into o(k, c) values(%1 + %2 + %3 + %4 + %5 + %6 + %7 - %8 - %9, $10)", ten, "5,raw,null;"}};
     for (const auto& c : cases) {
         ASSERT_EQ(Run(c.sql, c.values), 0) << c.sql;
         EXPECT_EQ(Query("select k, convert_from(lo_get(c), 'UTF8'), convert_from(b, 'UTF8') from o where k = 5"), c.stored) << c.sql;

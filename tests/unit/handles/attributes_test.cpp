@@ -187,7 +187,7 @@ TEST_F(AttributesTest, EveryNumberOverEveryKind) {
 TEST_F(AttributesTest, ValuesThatAreRefused) {
     const std::map<char, Handle> handles = OneOfEach();
     static ub4 integer = 0;
-    static const char* const text = "a group of more than 30 letters";
+    static const char* const text = "a group of more than 30 letters; and behind them more, up to 64 of them, and the rest";
     const struct { char kind; ub4 attribute; ub4 integer; const char* text; ub4 size; sb4 answer; } cases[] = {
         {'b', OCI_ATTR_PDSCL, 127, nullptr, 0, 0},           {'b', OCI_ATTR_PDSCL, 128, nullptr, 0, 24328},
         {'d', OCI_ATTR_PDSCL, 0xFFAC, nullptr, 0, 0},        {'d', OCI_ATTR_PDSCL, 0xFFAB, nullptr, 0, 24328},
@@ -196,7 +196,8 @@ TEST_F(AttributesTest, ValuesThatAreRefused) {
         {'d', OCI_ATTR_CHARSET_FORM, 0, nullptr, 0, 24328},  {'d', OCI_ATTR_CHARSET_ID, 870, nullptr, 0, 24329},
         {'t', OCI_ATTR_XID, 0, text, 139, 24750},            {'v', OCI_ATTR_SERVER_GROUP, 0, text, 31, 24328},
         {'v', OCI_ATTR_SERVER_GROUP, 0, text, 30, 0},        {'u', OCI_ATTR_MIGSESSION, 0, text, 0, 24328},
-        {'u', OCI_ATTR_PROXY_CREDENTIALS, 0, text, 0, 24328}};
+        {'u', OCI_ATTR_PROXY_CREDENTIALS, 0, text, 0, 24328}, {'t', OCI_ATTR_TRANS_NAME, 0, text, 64, 0},
+        {'t', OCI_ATTR_TRANS_NAME, 0, text, 65, 24328}};
     for (const auto& c : cases) {
         const Handle& on = handles.at(c.kind);
         integer = c.integer;

@@ -121,6 +121,7 @@ TEST_F(Lobs, PiecesGoByRepeatedCalls) {
     Temporary(lob);
     ub4 amount = 6;
     EXPECT_EQ(Write(lob, 1, "ab\xC3", OCI_FIRST_PIECE, &amount), OCI_NEED_DATA);
+    EXPECT_EQ(Answer(OCI_ERROR), 3129);
     ub4 length = 0;
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
     EXPECT_EQ(Read(lob), "!24804");
@@ -130,6 +131,7 @@ TEST_F(Lobs, PiecesGoByRepeatedCalls) {
     EXPECT_EQ(Write(lob, 99, "e", OCI_LAST_PIECE, &amount), 0);
     EXPECT_EQ(amount, 6u);
     EXPECT_EQ(Read(lob, 0, 1, 4), "more 4:ab\xC3\xA4");       // bytes, of a piece
+    EXPECT_EQ(Answer(OCI_ERROR), 3130);
     EXPECT_EQ(Read(lob, 77, 5, 4), "3:cde");
     EXPECT_EQ(Read(lob, 3, 1, 2), "more 2:ab");
     EXPECT_EQ(Read(lob, 3, 1, 2), "2:\xC3\xA4");

@@ -261,9 +261,11 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
     std::array<text, 512> message{};
     const auto* const words = reinterpret_cast<const char*>(message.data());
     EXPECT_EQ(Parse("select x from t", 0), 904);
-    EXPECT_EQ(oerhms(&lda, 904, message.data(), 512), 0);
-    const char* const told = server ? "column \"x\" does not exist" : "no such column: x";
-    EXPECT_NE(std::string_view(words).find(told), std::string_view::npos) << words;
+    const std::string_view told = server ? "column \"x\" does not exist" : "no such column: x";
+    for (const int code : {904, -904, 942}) {    // the last one, or another
+        EXPECT_EQ(oerhms(&lda, code, message.data(), 512), 0);
+        EXPECT_EQ(std::string_view(words).find(told) != std::string_view::npos, code != 942) << words;
+    }
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 5), 0);
     EXPECT_STREQ(words, "[KEL");
     EXPECT_EQ(oerhms(nullptr, 942, message.data(), 0), 1009);

@@ -171,4 +171,18 @@ TEST_F(Transactions, WhatWasDeferredIsChecked) {
     }
 }
 
+// A statement that rolls all back by itself ends the branch's work, and the branch with its next call.
+TEST_F(Transactions, WhatTheEngineUndoesIsLost) {
+    ASSERT_EQ(Run(0, "create table u(n integer primary key)"), 0);
+    for (const auto end : {OCITransPrepare, OCITransCommit}) {
+        MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into u values(1)"));
+        EXPECT_EQ(Run(0, "insert or rollback into u values(1)"), 1);
+        EXPECT_EQ(Run(0, "insert into u values(2)"), 24761);
+        EXPECT_EQ(Answer(end(svc_[0], err_, OCI_DEFAULT)), 24761);
+        EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24756);
+        SHOULD(Run(0, "insert into t select 1 / (case count(*) when 0 then 1 else 0 end) from u"),
+               Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)));
+    }
+}
+
 }  // namespace
