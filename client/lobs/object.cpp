@@ -149,7 +149,7 @@ Status LargeObject::Splice(std::uint64_t from, std::uint64_t to, std::string_vie
     std::uint64_t end = 0;
     if (Status status = Lob().Length(end); status.Failed()) return status;
     const std::uint64_t behind = from + data.size();
-    const bool moves = to < end && behind != to;
+    const bool moves = to < end;
     if (moves && behind > to) {
         if (Status status = Move(to, behind, end); status.Failed()) return status;
     }

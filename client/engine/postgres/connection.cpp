@@ -376,7 +376,11 @@ Status PgConnection::DropMark() {
 PgConnection::SavepointCommand PgConnection::ReadSavepoint(std::string_view sql) {
     const PieceList pieces = Split(sql);
     std::size_t at = 0;
-    const auto takes = [&](std::string_view word) { return at < pieces.size() && IsWord(pieces[at], word) && ++at > 0; };
+    const auto takes = [&](std::string_view word) {
+        const bool is_there = at < pieces.size() && IsWord(pieces[at], word);
+        at += is_there;
+        return is_there;
+    };
     SavepointCommand command;
     if (takes("savepoint")) {
         command.verb = SavepointCommand::Verb::set;

@@ -330,7 +330,7 @@ TEST_F(Pools, AServerAttachedToAConnectionPool) {
     const auto size = [&](ub4 attribute) { return Attribute<ub4>(pool, OCI_HTYPE_CPOOL, attribute); };
     EXPECT_EQ(size(OCI_ATTR_CONN_MIN) * 100 + size(OCI_ATTR_CONN_MAX) * 10 + size(OCI_ATTR_CONN_INCR), 11u);
     auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
-    ASSERT_EQ(Answer(OCIServerAttach(server, err_, name, length, OCI_CPOOL)), 0);
+    for (const sb4 answer : {0, 24309}) ASSERT_EQ(Answer(OCIServerAttach(server, err_, name, length, OCI_CPOOL)), answer);
     auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
     ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
     OCISession* sessions[] = {User(ann_.c_str(), "secret"), User(ann_.c_str(), "secret")};

@@ -428,7 +428,7 @@ TEST_F(Lobs, TwoLocatorsOfOneValue) {
     EXPECT_EQ(Write(lob, 1, "x"), 0);
     EXPECT_EQ(Read(other, 2, 4) + std::to_string(LengthOf(other)), "2:lo11");
     EXPECT_EQ(Write(lob, 1, "\xC3\xB6"), 0);
-    EXPECT_EQ(Read(other, 2, 4) + std::to_string(LengthOf(other)), "2:lo11");
+    EXPECT_EQ(Read(other, 2, 7) + std::to_string(LengthOf(other)), "2:wo11");
     EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 5)), 0);
     EXPECT_EQ(Read(other, 9, 4) + std::to_string(LengthOf(other)), "2:lo5");
     EXPECT_EQ(Stored(), "\xC3\xB6\xC3\xA4llo");

@@ -266,6 +266,10 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
         EXPECT_EQ(oerhms(&lda, code, message.data(), 512), 0);
         EXPECT_EQ(std::string_view(words).find(told) != std::string_view::npos, code != 942) << words;
     }
+    EXPECT_EQ(Parse("select  x from t", 1), 0);
+    cda.peo = 0;
+    EXPECT_EQ(oexec(&cda), 904);
+    EXPECT_EQ(cda.peo, 8);
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 5), 0);
     EXPECT_STREQ(words, "[KEL");
     EXPECT_EQ(oerhms(nullptr, 942, message.data(), 0), 1009);

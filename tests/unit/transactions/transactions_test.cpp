@@ -183,6 +183,15 @@ TEST_F(Transactions, WhatTheEngineUndoesIsLost) {
         SHOULD(Run(0, "insert into t select 1 / (case count(*) when 0 then 1 else 0 end) from u"),
                Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)));
     }
+    // So does a session that goes, for all that are coupled with its branch.
+    MUST(Start(0, 60, OCI_TRANS_NEW), Run(0, "insert into u values(1)"), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
+    auto* branch = Attribute<OCITrans*>(svc_[1], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
+    XID coupled{5, 2, 1, "txc"};
+    ASSERT_EQ(Answer(OCIAttrSet(branch, OCI_HTYPE_TRANS, &coupled, sizeof coupled, OCI_ATTR_XID, err_)), 0);
+    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW), 0);
+    EXPECT_EQ(OCIHandleFree(svc_[1], OCI_HTYPE_SVCCTX), OCI_SUCCESS);
+    for (const sb4 answer : {24761, 24756}) EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), answer);
+    EXPECT_EQ(Run(0, "insert into u values(1)"), 0);
 }
 
 }  // namespace
