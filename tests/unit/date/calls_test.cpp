@@ -12,11 +12,7 @@ OCIDate Date(int year, int month, int day, int hour = 0, int minute = 0, int sec
 
 class DateCalls : public CallFixture {
 protected:
-    OCIDateTime* NewDateTime(ub4 type) {
-        dvoid* descriptor = nullptr;
-        EXPECT_EQ(OCIDescriptorAlloc(env_, &descriptor, type, 0, nullptr), OCI_SUCCESS) << type;
-        return static_cast<OCIDateTime*>(descriptor);
-    }
+    OCIDateTime* NewDateTime(ub4 type) const { return NewDescriptor<OCIDateTime>(type); }
 
     sword Construct(OCIDateTime* target, const char* zone = nullptr, ub4 fraction = 0) {
         return OCIDateTimeConstructNS(env_, err_, target, 2024, 7, 15, 13, 14, 15, fraction,

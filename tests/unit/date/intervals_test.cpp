@@ -5,12 +5,6 @@
 namespace {
 
 struct IntervalCalls : CallFixture {
-    template <class T>
-    T* NewDescriptor(ub4 type) {
-        dvoid* descriptor = nullptr;
-        EXPECT_EQ(OCIDescriptorAlloc(env_, &descriptor, type, 0, nullptr), OCI_SUCCESS);
-        return static_cast<T*>(descriptor);
-    }
     // "years-months" or "days h:m:s.f"; the error's number where it cannot be read.
     OCIInterval* Read(std::string_view text, bool months, sb4* number) {
         auto* interval = NewDescriptor<OCIInterval>(months ? OCI_DTYPE_INTERVAL_YM : OCI_DTYPE_INTERVAL_DS);

@@ -7,18 +7,6 @@
 namespace {
 
 struct NullArguments : CallFixture {
-    template <class T>
-    T* Descriptor(ub4 type) {
-        dvoid* made = nullptr;
-        EXPECT_EQ(OCIDescriptorAlloc(env_, &made, type, 0, nullptr), OCI_SUCCESS);
-        return static_cast<T*>(made);
-    }
-    OCIDateTime* Moment() {
-        auto* moment = Descriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
-        EXPECT_EQ(OCIDateTimeConstruct(env_, err_, moment, 2024, 7, 15, 13, 14, 15, 0, nullptr, 0), OCI_SUCCESS);
-        return moment;
-    }
-
     // One letter for the call as it is given, then one for each pointer in its place: . success, h no handle, n 21560.
     template <class... Parameters, class... Given>
     std::string Nulls(sword (*call)(Parameters...), Given... given) {
@@ -94,12 +82,14 @@ TEST_F(NullArguments, OfDates) {
 }
 
 TEST_F(NullArguments, OfDatetimes) {
-    OCIDateTime* at = Moment();
-    auto* days = Descriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
+    auto* at = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
+    auto* to = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
+    EXPECT_EQ(OCIDateTimeSysTimeStamp(env_, err_, at), OCI_SUCCESS);
+    auto* days = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     sb2 year = 0;
     ub1 part = 0;
     sb1 offset = 0;
-    Compare({{".hhnn", Nulls(OCIDateTimeAssign, env_, err_, at, Moment())},
+    Compare({{".hhnn", Nulls(OCIDateTimeAssign, env_, err_, at, to)},
              {".hhnn", Nulls(OCIDateTimeCheck, env_, err_, at, &flags_)},
              {".hhnnn", Nulls(OCIDateTimeCompare, env_, err_, at, at, &order_)},
              {".hhn.", Nulls(OCIDateTimeConstruct, env_, err_, at, 2024, 7, 15, 1, 2, 3, 0, nullptr, 0)},
@@ -111,7 +101,7 @@ TEST_F(NullArguments, OfDatetimes) {
              {".hhn..nn", Nulls(OCIDateTimeToText, env_, err_, at, Text("YYYY"), 4, 0, nullptr, 0, &size_, text_)},
              {".hhnnn", Nulls(OCIDateTimeGetTimeZoneOffset, env_, err_, at, &offset, &offset)},
              {".hhnnn", Nulls(OCIDateTimeGetTimeZoneName, env_, err_, at, text_, &size_)},
-             {".hhnn", Nulls(OCIDateTimeConvert, env_, err_, at, Moment())},
+             {".hhnn", Nulls(OCIDateTimeConvert, env_, err_, at, to)},
              {".hhn", Nulls(OCIDateTimeSysTimeStamp, env_, err_, at)},
              {".hhnnn", Nulls(OCIDateTimeSubtract, env_, err_, at, at, days)},
              {".hhnnn", Nulls(OCIDateTimeIntervalAdd, env_, err_, at, days, at)},
@@ -119,8 +109,8 @@ TEST_F(NullArguments, OfDatetimes) {
 }
 
 TEST_F(NullArguments, OfIntervals) {
-    auto* days = Descriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
-    auto* months = Descriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
+    auto* days = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
+    auto* months = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
     sb4 part[5];
     Compare({{".hhn", Nulls(OCIIntervalSetDaySecond, env_, err_, 1, 2, 3, 4, 5, days)},
              {".hhn", Nulls(OCIIntervalSetYearMonth, env_, err_, 1, 2, months)},

@@ -90,6 +90,12 @@ protected:
     T* New(ub4 type) const {
         return NewHandle<T>(env_, type);
     }
+    template <class T>
+    T* NewDescriptor(ub4 type) const {
+        dvoid* descriptor = nullptr;
+        EXPECT_EQ(OCIDescriptorAlloc(env_, &descriptor, type, 0, nullptr), OCI_SUCCESS) << type;
+        return static_cast<T*>(descriptor);
+    }
     // The record's number after OCI_ERROR; else the return code.
     static sb4 Answer(sword code, OCIError* err) {
         const sb4 number = code == OCI_ERROR ? FirstCode(err) : 0;
