@@ -112,29 +112,6 @@ TEST_P(Contract, RowIdNamesItsRow) {
 
 // ---- Array executions
 
-TEST_P(Contract, ArrayStopsAtTheFirstFailureUnlessAllRowsAreTried) {
-    ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
-    const auto insert = Prepared("insert into t values(%1)", std::vector{Integer(1)});
-    Rows rows{{Integer(1)}, {Integer(1)}, {Integer(2)}, {Integer(2)}, {Integer(3)}};
-    const auto stopped = Executed(*insert, rows, {.first = 0, .last = 5});
-    EXPECT_EQ(stopped.executed, 1u);
-    EXPECT_EQ(Failures(stopped), "1:1 ");
-    EXPECT_EQ(All(), "1;") << "the row before the failure stays";
-
-    rows.refused_row = 4;
-    engine::ArrayOutcome all;
-    all.affected = 10;
-    ASSERT_TRUE(insert->ExecuteArray(rows, {.first = 1, .last = 5, .all_rows = true}, all).Ok());
-    EXPECT_EQ(all.executed, 1u);
-    EXPECT_EQ(all.affected, 11u) << "added to what was there";
-    EXPECT_EQ(Failures(all), "1:1 3:1 4:1722 ") << "the last is what the source refuses";
-    EXPECT_EQ(All(), "1;2;");
-    ASSERT_EQ(Run("insert into t values(3)"), 0);
-    ASSERT_TRUE(Prepared("savepoint here")->ExecuteArray(rows, {}, all).Ok());
-    EXPECT_EQ(all.affected, 11u) << "nothing is changed";
-    EXPECT_EQ(all.executed, 2u);
-}
-
 // Long enough for an engine to hand it over in another way.
 TEST_P(Contract, LongArraysKeepTheirValuesAndFailTheirRows) {
     ASSERT_EQ(Run("create table t(n integer primary key, d double precision, p numeric(38), v varchar(9), m timestamp)"), 0);
@@ -163,19 +140,6 @@ TEST_P(Contract, LongArraysKeepTheirValuesAndFailTheirRows) {
     for (auto& row : rows.rows) row = {row[0], Text("x")};
     Executed(*Prepared("insert into t(n, v) values(%1 + 1, upper(%2))", rows.rows[0]), rows, {.first = 20, .last = 40});
     EXPECT_EQ(Query("select sum(n), max(v) from t"), "610,X;") << "more than placeholders";
-}
-
-TEST_P(Contract, ChangesReturnTheirRowsByExecution) {
-    MakeNumbers();
-    const auto update = Prepared("update t set n = n + 10 where n <= %1 returning n, n - 10", std::vector{Integer(1)});
-    ASSERT_EQ(update->Columns().size(), 2u);
-    Rows rows{{Integer(1)}, {Integer(3)}, {Integer(0)}};
-    Written written;
-    const auto outcome = Executed(*update, rows, {.first = 0, .last = 3, .returned = &written});
-    EXPECT_EQ(written.text, "11,1;1:12,2;1:13,3;");
-    EXPECT_EQ(outcome.affected, 3u);
-    EXPECT_EQ(outcome.executed, 3u);
-    Executed(*update, rows);    // whose rows nobody takes
 }
 
 TEST_P(Contract, ExecutionWhoseRowsAreRefusedIsUndone) {
@@ -254,28 +218,6 @@ TEST_P(Contract, LockingQueryBeginsATransaction) {
     EXPECT_TRUE(connection_->InTransaction());
 }
 
-TEST_P(Contract, StatementThatFailsUndoesItselfAndNotTheTransaction) {
-    ASSERT_EQ(Run("create table t(n integer primary key)"), 0);
-    EXPECT_EQ(Run("insert into t select 1 union all select 1"), 1);
-    EXPECT_FALSE(connection_->InTransaction()) << "it began one and did nothing in it";
-    EXPECT_EQ(Run("insert into t values(5)"), 0);
-    EXPECT_EQ(Run("insert into t select 6 union all select 5"), 1);
-    EXPECT_TRUE(connection_->InTransaction());
-    EXPECT_EQ(All(), "5;");
-}
-
-TEST_P(SharedContract, EndOfTheSessionRollsBack) {
-    MakeNumbers();
-    const auto other = Connect();
-    ASSERT_EQ(Run("insert into t values(4)"), 0);
-    EXPECT_EQ(Query(*other, "select count(*) from t"), "3;") << "nobody sees what is not committed";
-    connection_.reset();
-    EXPECT_EQ(Query(*other, "select count(*) from t"), "3;");
-    ASSERT_EQ(Run(*other, "insert into t values(4)"), 0) << "nothing is locked any more";
-    ASSERT_EQ(Answer(other->Commit()), 0);
-    EXPECT_EQ(Query(*Connect(), "select count(*) from t"), "4;");
-}
-
 TEST_P(Contract, MarksNest) {
     MakeNumbers(1);
     ASSERT_EQ(Answer(connection_->SetMark()), 0);
@@ -338,16 +280,6 @@ TEST_P(Contract, DefinitionEndsAReadOnlyTransaction) {
     EXPECT_FALSE(connection_->InTransaction());
 }
 
-TEST_P(SharedContract, LockedRowsAnswerAfterAWhile) {
-    MakeNumbers();
-    const auto other = Connect();
-    ASSERT_EQ(Run(*other, "update t set n = n + 1"), 0);
-    EXPECT_EQ(Run("update t set n = n + 2"), 54);
-    EXPECT_FALSE(connection_->InTransaction());
-    EXPECT_EQ(All(), "1;2;3;") << "readers go on";
-    MUST(Answer(other->Rollback()), Run("update t set n = n + 2"));
-}
-
 TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
     ASSERT_EQ(Run("create table t(n integer)"), 0);
     engine::Xid xid{.format = -7, .global_length = 64, .branch_length = 64, .data = {'x', '\0', '\xFF'}};
@@ -406,38 +338,6 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
 }
 
 // ---- Open queries
-
-TEST_P(Contract, FetchDeliversUpToWhatIsAskedFor) {
-    MakeNumbers(5);
-    const auto query = Opened("select n from t order by n");
-    EXPECT_TRUE(query->IsOpen());
-    Written rows;
-    bool more = false;
-    ASSERT_EQ(Answer(query->Fetch(rows, 2, more)), 0);
-    EXPECT_EQ(rows.text, "1;2;");
-    EXPECT_TRUE(more);
-    rows.refused = 3;
-    EXPECT_EQ(Answer(query->Fetch(rows, 9, more)), 1405) << "what the sink answers";
-    EXPECT_TRUE(query->IsOpen());
-    ASSERT_EQ(Answer(query->Fetch(rows, 9, more)), 0);
-    EXPECT_EQ(rows.text, "1;2;4;5;") << "on behind the refused row";
-    EXPECT_FALSE(more);
-    EXPECT_FALSE(query->IsOpen());
-    EXPECT_EQ(Answer(query->Fetch(rows, 1, more)), 1002);
-    EXPECT_FALSE(more);
-
-    Rows none;
-    ASSERT_EQ(Answer(query->Open(none, {})), 0);
-    ASSERT_EQ(Answer(query->Open(none, {})), 0) << "one that is open is closed first";
-    EXPECT_EQ(Fetched(*query, 1), "1;");
-    query->Close();
-    query->Close();
-    EXPECT_EQ(Fetched(*query, 1), "error 1002");
-    const auto empty = Opened("select n from t where n > 99");
-    EXPECT_TRUE(empty->IsOpen());
-    EXPECT_EQ(Rest(*empty), "");
-    EXPECT_FALSE(empty->IsOpen());
-}
 
 TEST_P(Contract, RowThatFindsNoMemoryComesAgain) {
     MakeNumbers();
