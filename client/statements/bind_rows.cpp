@@ -19,7 +19,7 @@ int LoadCollected(BindArea& bind, std::uint32_t element, engine::Datum& value) {
     }
     std::string_view data = bind.in[element].bytes;
     if (bind.Type()->family != values::Family::text) return values::FromWholeBytes(data, bind.workspace, value);
-    if (bind.Type()->code == SQLT_STR && !bind.workspace.utf16) data = data.substr(0, data.find('\0'));
+    if (bind.Type()->code == SQLT_STR) data = data.substr(0, values::EndOfText(data, bind.workspace.utf16));
     return values::FromWholeText(data, bind.workspace, value);
 }
 

@@ -46,12 +46,6 @@ int PieceCollector::Append(const DataArea& area, WholeValue& whole, std::string_
 
 // Text of a terminated type ends at the zero.
 int PieceCollector::Write(const DataArea& area, engine::Lob& object, std::string_view piece, bool last) {
-    if (area.Type()->code == SQLT_STR && !area.workspace.utf16) {
-        if (closed_) piece = {};
-        const std::size_t end = piece.find('\0');
-        closed_ = closed_ || end != std::string_view::npos;
-        piece = piece.substr(0, end);
-    }
     const bool converts = IsText(area) && area.workspace.set;
     std::uint64_t at = 0;
     if (Status status = object.Length(at); status.Failed()) return status.Number();
@@ -64,6 +58,11 @@ int PieceCollector::Write(const DataArea& area, engine::Lob& object, std::string
             utf8.clear();
             if (!charset::PartToUtf8(*area.workspace.set, part, last && !more, torn_, utf8)) return errors::kBadCharacters;
             part = utf8;
+        }
+        if (area.Type()->code == SQLT_STR) {
+            const std::size_t end = closed_ ? 0 : part.find('\0');
+            closed_ = end != std::string_view::npos;
+            part = part.substr(0, end);
         }
         if (Status status = object.Write(at, std::as_bytes(std::span(part))); status.Failed()) return status.Number();
         at += part.size();

@@ -57,9 +57,7 @@ int PrefixedBytes(const Source& source, View& bytes) {
 // Up to the zero, which stands within the length given or within the area.
 int TerminatedBytes(const Source& source, bool utf16, View& bytes) {
     if (const int error = GivenBytes(source, bytes)) return error;
-    std::size_t end = 0;
-    if (!utf16) end = std::min(bytes.find('\0'), bytes.size());
-    else while (end + 2 <= bytes.size() && (bytes[end] != 0 || bytes[end + 1] != 0)) end += 2;
+    const std::size_t end = EndOfText(bytes, utf16);
     const std::size_t zero = utf16 ? 2 : 1;
     const bool found = end + zero <= bytes.size();
     if (!found && !source.has_length && !bytes.empty()) return errors::kNoTerminator;
@@ -107,6 +105,13 @@ int SetDate(const date::DateTime& value, Workspace& workspace, Datum& datum) {
 }
 
 }  // namespace
+
+std::size_t EndOfText(View bytes, bool utf16) {
+    if (!utf16) return std::min(bytes.find('\0'), bytes.size());
+    for (std::size_t at = 0; at + 2 <= bytes.size(); at += 2)
+        if (bytes[at] == 0 && bytes[at + 1] == 0) return at;
+    return bytes.size();
+}
 
 int FromWholeText(View data, Workspace& workspace, Datum& datum) { return SetText(data, workspace, datum); }
 int FromWholeBytes(View data, Workspace&, Datum& datum) { return SetView(Kind::bytes, data, datum), 0; }

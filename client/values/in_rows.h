@@ -40,6 +40,8 @@ int RowIdFromText(Workspace&, engine::Datum&);
 void SetTimestamp(const date::DateTime& value, Workspace&, engine::Datum&);
 
 // A whole value that came in pieces; data must live until the Datum is used.
+// Where the zero of a text of a terminated type stands, else its end.
+std::size_t EndOfText(std::string_view bytes, bool utf16);
 int FromWholeText(std::string_view data, Workspace&, engine::Datum&);
 int FromWholeBytes(std::string_view data, Workspace&, engine::Datum&);
 

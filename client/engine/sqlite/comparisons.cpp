@@ -64,7 +64,7 @@ private:
     bool IsAssignment(std::size_t equals) const {
         std::size_t first = equals - 1;
         if (At(first) == ")") first = operands_.Partner(first);
-        return first > 0 && (IsWord(At(first - 1), "set") || At(first - 1) == ",");
+        return IsWord(At(first - 1), "set") || At(first - 1) == ",";
     }
 
     void Compare(Span left, Span right) {

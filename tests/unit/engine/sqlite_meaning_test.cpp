@@ -329,7 +329,7 @@ protected:
 
 TEST_F(SqliteDescribes, NumbersBeforeTheyAreKnownAndOverNoRows) {
     MustRun("create table t(a number(5), b varchar2(9), d date)");
-    for (const char* number : {"count(*)", "sum(a)", "a+1", "5", "-a", "1.5e3", "(a * 2)", "a + 1 x", "count(b) as n",
+    for (const char* number : {"count(*)", "sum(a)", "a+1", "5", ".5", "-a", "1.5e3", "(a * 2)", "a + 1 x", "count(b) as n",
                                "avg(a) - 1", "length(b)", "count(*) filter (where a > 1)",
                                "round(a, 2)", "to_number(b) + :x", "sum(a) over (partition by b) c", "a % 2", "max(5)"}) {
         EXPECT_EQ(TypeOf(number), SQLT_NUM) << number;

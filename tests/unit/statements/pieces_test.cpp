@@ -341,6 +341,30 @@ protected:
     Utf16Pieces() : PieceByPiece(OCI_UTF16) {}
 };
 
+// Terminated ones end at their zero, in whatever piece it comes; what is short is held, what is long is not.
+TEST_F(Utf16Pieces, EndAtTheirZero) {
+    MustRun("create table u(c clob)");
+    for (const std::size_t characters : {0, 9'000'000}) {
+        MustRun("delete from u");
+        std::string first;
+        while (first.size() < 2 * characters) (first += 'x') += '\0';
+        const std::string pieces[] = {first + std::string("a\0b", 3), {"\0\0\0c\0", 5}, {"d\0", 2}};
+        ASSERT_EQ(Ready("insert into u values(:1)", {InPieces(SQLT_STR)}), 0);
+        sword rc = ExecuteCode();
+        for (const std::string& piece : pieces) {
+            ASSERT_EQ(rc, OCI_NEED_DATA);
+            ub4 length = Size(piece);
+            const ub1 place = &piece == pieces ? OCI_FIRST_PIECE : length == 2 ? OCI_LAST_PIECE : OCI_NEXT_PIECE;
+            ASSERT_EQ(Set(piece.data(), &length, place), 0);
+            rc = ExecuteCode();
+        }
+        EXPECT_EQ(rc, OCI_SUCCESS);
+        sb4 count = 0;
+        EXPECT_EQ(Query("select length(c) from u", {Int(count)}), 0);
+        EXPECT_EQ(count, static_cast<sb4>(characters) + 2);
+    }
+}
+
 // Two zero bytes close a terminated piece; neither a unit nor a pair of them is torn.
 TEST_F(Utf16Pieces, EndBetweenCharacters) {
     using std::string_view;
