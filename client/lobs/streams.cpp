@@ -309,14 +309,13 @@ Status Write(LobDescriptor& descriptor, Link& link, const TransferArguments& arg
         if (status.Number() == errors::kCancelled) link.lobs->stream = nullptr;
         return status;
     }
-    const bool begins = !give && !stream && arguments.piece == OCI_FIRST_PIECE;
-    const bool one = !give && !stream && arguments.piece == OCI_ONE_PIECE;
+    const bool one = !give && arguments.piece == OCI_ONE_PIECE;
     if (stream && arguments.piece != OCI_NEXT_PIECE && arguments.piece != OCI_LAST_PIECE)
         return Error(errors::kStreamInProgress);
     if (!stream) {
         stream = std::make_shared<Stream>();
         if (Status status = StartWriting(descriptor, link, arguments, *stream); status.Failed()) return status;
-        if (!give && !begins && !one) return Error(errors::kBadLobParameter);
+        if (!give && !one && arguments.piece != OCI_FIRST_PIECE) return Error(errors::kBadLobParameter);
     }
     if (!give && !arguments.buffer) return Error(errors::kBadLobParameter);
     if (stream->object.State().buffer && !one) return Error(errors::kNoStreamWhenBuffered);

@@ -97,7 +97,13 @@ TEST(TextIn, EndsAtAZeroOrItsLength) {
     }
 }
 
-TEST(CharacterSets, NoPairIsTorn) {
+TEST(CharacterSets, NoPairIsTornAndWhatIsMalformedIsReplaced) {
+    const std::pair<std::uint16_t, std::string_view> replaced[] = {{31, "a?z"}, {1000, {"a\0\xFD\xFFz\0", 6}}, {2000, {"\0a\xFF\xFD\0z", 6}}};
+    for (const auto& [id, expected] : replaced) {
+        std::string text;
+        EXPECT_FALSE(charset::FromUtf8(*charset::Find(id), "a\xFFz", text)) << id;
+        EXPECT_EQ(text, expected) << id;
+    }
     const std::size_t whole[] = {0, 0, 2, 2, 2, 2, 6, 6, 8, 8};
     for (const std::uint16_t id : {1000, 2000}) {
         std::string text;

@@ -202,8 +202,9 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     pieces = {"ab", "\xC3\xA4"};
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 4), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 0)
         << "bytes are an amount, too";
-    pieces = {"abc", "de"};
+    pieces = {"abc", "xy"};
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 4), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 24810);
+    EXPECT_EQ(Read(lob), "6:abcde\xC3\xA4") << "without the piece too many";
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 7), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {"abc", "def"}),
                                  Gives, 0, 0)), 24811);
     std::string elsewhere(8, '#');
