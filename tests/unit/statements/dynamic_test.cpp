@@ -379,9 +379,10 @@ TEST_F(Utf16Dynamic, PiecesOfUnits) {
     MustRun("create table t(a varchar2(40))");
     const string text(reinterpret_cast<const char*>(u"a\U0001F600z"), 8);
     Giver giver({"<" + text.substr(0, 3), "+" + text.substr(3, 2), ">" + text.substr(5)});
-    Taker returned(5), fetched(20);
-    MUST(Prepare("insert into t values(:1) returning a into :2"), BindTo(1, &giver, nullptr));
-    MUST(BindTo(2, nullptr, &returned), Execute());
+    Taker returned(5), bytes(5), fetched(20);
+    MUST(Prepare("insert into t values(:1) returning a, x'c3a4' into :2, :3"), BindTo(1, &giver, nullptr));
+    MUST(BindTo(2, nullptr, &returned), BindTo(3, nullptr, &bytes, SQLT_BIN), Execute());
+    EXPECT_EQ(bytes.Flush(), "\xC3\xA4|");
     EXPECT_EQ(returned.Flush(), text + "|");
     EXPECT_EQ(returned.asked, "0.0.0 0.0.2 0.0.2 ");
     MUST(Prepare("select a || a from t"), DefineTo(1, fetched, SQLT_STR), Execute(1));

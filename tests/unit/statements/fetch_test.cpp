@@ -52,6 +52,7 @@ TEST_F(Fetching, WhatIsWrongWithTheCall) {
     EXPECT_EQ(Answer(FetchCode()), 24338);
     EXPECT_EQ(Define(1, Int(ids_)), 24337);
     EXPECT_EQ(Bind(1, Int(ids_)), 24337);
+    EXPECT_EQ(BindName(":a", Int(ids_)), 24337);
     Open();
     EXPECT_EQ(Fetch(1, OCI_FETCH_FIRST), 24391);
     EXPECT_EQ(Fetch(1, 0x77), 24391);

@@ -141,7 +141,7 @@ TEST_F(Handles, FreedByAMemoryFunction) {
         ASSERT_EQ(Define(&define, 1, {string.get(), 8, SQLT_VST, indicator.get()}), 0);
         saboteur.type = statement_too ? OCI_HTYPE_STMT : OCI_HTYPE_DEFINE;
         saboteur.victim = statement_too ? static_cast<dvoid*>(stmt) : define;
-        EXPECT_EQ(FetchCode(), OCI_ERROR);
+        EXPECT_EQ(Fetch(), 24374);
         EXPECT_EQ(*string, nullptr) << "the define's memory is the application's again";
         EXPECT_EQ(FetchCode(), statement_too ? OCI_INVALID_HANDLE : OCI_ERROR);
         OCILogoff(svc, err);
