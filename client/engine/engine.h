@@ -290,7 +290,6 @@ protected:
 
 struct Capabilities {
     bool two_phase = false;             // Prepare and its kin
-    bool prepared_survives = false;     // a prepared branch outlives the process
     bool lobs = false;                  // Lobs()
     bool sequences = false;
     bool typed_parameters = false;      // a statement must be compiled anew when the kinds of its parameters change

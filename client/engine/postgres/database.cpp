@@ -122,8 +122,8 @@ const Dialect& PgDatabase::GetDialect() const {
 const Capabilities& PgDatabase::GetCapabilities() const {
     static constexpr Capabilities kOnePhase{
         .lobs = true, .sequences = true, .typed_parameters = true, .statement_waits = true};
-    static constexpr Capabilities kTwoPhase{.two_phase = true, .prepared_survives = true, .lobs = true, .sequences = true,
-                                            .typed_parameters = true, .statement_waits = true};
+    static constexpr Capabilities kTwoPhase{
+        .two_phase = true, .lobs = true, .sequences = true, .typed_parameters = true, .statement_waits = true};
     return home_->TwoPhase() ? kTwoPhase : kOnePhase;
 }
 
