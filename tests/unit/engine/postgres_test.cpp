@@ -8,6 +8,7 @@
 #include <csignal>
 #include <thread>
 
+#include "engine/postgres/errors.h"
 #include "engine/engine_fixture.h"
 #include "number/digits.h"
 #include "support/postgres_database.h"
@@ -294,6 +295,7 @@ TEST_F(Postgres, StatesAsNumbers) {
         EXPECT_EQ(Run("do $$ begin raise exception using errcode = '" + std::string(c.substr(0, 5)) + "', message = 'm" + words +
                       "'; end $$"), std::atoi(c.data() + 6)) << c;
     }
+    EXPECT_STREQ(engine::postgres::RolledBack(Error(1653)).Engine(), "POSTGRESQL");
     EXPECT_FALSE(connection_->Broken());
 }
 
@@ -355,6 +357,11 @@ TEST_F(Postgres, ValuesAtTheirLimits) {
         {"%1::interval", "7 days", "7 0:00:00;"}, {"%1::bytea", "0aFF", "\\x0aff;"}};
     for (const auto& c : texts) EXPECT_EQ(Query("select (" + std::string(c.expression) + ")::text", {Text(c.bound)}), c.text) << c.bound;
     EXPECT_EQ(Query("select %1::pg_catalog.date::text", {Moment(leap)}), "2024-02-29;");
+    Rows forms;    // ours, and one that the server reads
+    forms.rows = {{Text("1-2")}, {Text("7 days")}};
+    MustRun("create table spans(s interval)");
+    EXPECT_EQ(Execute(*Prepared("insert into spans values(%1)", forms.rows[0]), forms, {.first = 0, .last = 2}), 0);
+    EXPECT_EQ(Query("select s::text from spans"), "1-2;7 0:00:00;");
     const struct { date::DateTime value; bool is_date; const char* read; std::uint16_t type; } literals[] = {
         {leap, true, "time 2024-02-29 12:00:00;", SQLT_DAT}, {leap, false, "time 2024-02-29 12:00:00;", SQLT_TIMESTAMP},
         {zoned, false, "time 2024-02-29 06:30:00 +00:00;", SQLT_TIMESTAMP_TZ}};

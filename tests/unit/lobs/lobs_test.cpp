@@ -86,7 +86,7 @@ TEST_F(Lobs, Utf16IsConvertedBothWays) {
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &amount, 1, data.data(), 8, OCI_ONE_PIECE, nullptr, nullptr, 1000, 0)), 0);
     EXPECT_EQ(amount, 3u);
     EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF0\x9F\x98\x80");
-    EXPECT_EQ(Read(lob, 2, 2, 6, 1000), "2:" + data.substr(2));
+    EXPECT_EQ(Read(lob, 2, 2, 6, 1000) + Read(lob, 3, 1, 8, 1000), "2:" + data.substr(2) + "3:" + data);
     EXPECT_EQ(Read(lob, 1, 1, 10, 9999), "!24329");
     const struct { ub4 amount; ub2 set; std::string data; const char* kept; } counted[] = {
         {2, 1000, data, "2:a\xC3\xA4"}, {2, 1000, data.substr(4) + data, "2:\xF0\x9F\x98\x80" "a"}, {9, 1000, data, "!22921"},
@@ -479,6 +479,7 @@ TEST_F(Lobs, WrongLocatorsAndAmountsAreRefused) {
     Fetch(other, "select b from l for update", SQLT_BLOB);
     EXPECT_EQ(Answer(OCILobRead2(svc, err, other, &(far = 9), &(units = 1), 1, bytes, 5, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(far, 3u) << "of bytes no characters count";
+    EXPECT_EQ(Answer(OCILobTrim(svc, err, other, 4)), 22926);
     EXPECT_EQ(Write(lob, 1, "h\xC3\xA4"), 0);
     far = ~oraub8{0};
     EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &(far = 1), ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)), 24281);

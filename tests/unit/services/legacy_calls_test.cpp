@@ -151,6 +151,10 @@ TEST_F(LegacyCalls, ColumnsAreDescribedUntilThereIsNone) {
     SHOULD(Define(1, &number, 4, SQLT_INT), oexec(&cda), ocan(&cda));
     EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);
     EXPECT_EQ(odescr(&cda, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
+    sb2 scale = 0;
+    SHOULD(Parse("select cast(n as number) from t"),
+           odescr(&cda, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &scale, nullptr));
+    EXPECT_EQ(scale, -127);
     ASSERT_EQ(Parse("select n from t"), 0);
     EXPECT_EQ(Define(2, &number, 4, SQLT_INT), 0);       // nobody knows yet
     EXPECT_EQ(oexec(&cda), 1007);

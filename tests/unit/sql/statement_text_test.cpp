@@ -150,7 +150,7 @@ TEST(SqlText, WhatTheTextTellsToBeWrong) {
         {"End;", 900, 0}, {"/* */ pragma page_size", 900, 6}, {"attach 'x' as y", 900, 0}, {"detach y", 900, 0},
         {"vacuum", 900, 0}, {"reindex", 900, 0}, {"explain pragma page_size", 900, 0}, {"; pragma page_size", 900, 0},
         {"begin open :c for select 1 end;", 6550, 31}, {"begin if x then null; end if; end;", 6550, 6},
-        {"begin open :c for ; end;", 6550, 6}, {"begin select 1 from t; end;", 6550, 6},
+        {"begin open :c for ; end;", 6550, 6}, {"begin open :c as select 1; end;", 6550, 6}, {"begin select 1 from t; end;", 6550, 6},
         {"begin null; end; select 1", 6550, 17}, {"begin null;", 6550, 11},
         {"declare x number; begin null; end;", 6550, 0}, {"begin end;", 6550, 0}, {"begin explain select 1; end;", 6550, 6}, {"begin x := 1; end;", 6550, 6},
     };
