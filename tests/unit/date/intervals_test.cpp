@@ -232,6 +232,7 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, date, 2024, 7, 16, 13, 14, 15, 0, nullptr, 0)), 0);
     EXPECT_EQ(Shown(date, "DD HH24:MI:SS"), "16 00:00:00");
     EXPECT_EQ(Shown(date, "FF"), "1821");
+    EXPECT_EQ(Answer(OCIDateTimeFromText(env_, err_, Text("5"), 1, Text("FF"), 2, nullptr, 0, date)), 1821);
     auto* time = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIME);
     EXPECT_EQ(Shown(time, "MI"), "1866");
     EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, time, 7, 8, 9, 0)), 0);

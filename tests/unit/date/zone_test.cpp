@@ -196,7 +196,9 @@ TEST(ZoneDeath, TheProcessHasTheZoneThatTzNames) {
         EXPECT_EXIT({
             setenv("TZ", c.variable, 1);
             DateTime value = Read("2024-01-01");
-            std::exit(SetZone({}, &value) == 0 && value.zone_minutes == c.minutes ? 0 : 1);
+            std::int64_t seconds = 0;    // from what has no zone to midnight at Greenwich
+            const Errno number = SecondsBetween(Read("2024-01-01 00:00:00 +00:00"), value, &seconds);
+            std::exit(number == 0 && seconds == c.minutes * 60 && SetZone({}, &value) == 0 && value.zone_minutes == c.minutes ? 0 : 1);
         }, testing::ExitedWithCode(0), "") << c.variable;
     }
 }

@@ -149,7 +149,7 @@ TEST_F(NullArguments, OfStringsAndSets) {
              {".hnn.", Nulls(OCIUnicodeToCharSet, env_, text_, 8, units, 1, &length_)}});
     EXPECT_EQ(OCIUnicodeToCharSet(env_, text_, 8, units, SIZE_MAX / 2 + 1, &length_), OCI_ERROR);
     EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 21560);
-    EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 2, OCI_NLS_NCHARSET_ID, 0, &length_), OCI_SUCCESS);
+    EXPECT_EQ(OCINlsEnvironmentVariableGet(units, sizeof units, OCI_NLS_NCHARSET_ID, 0, &length_), OCI_SUCCESS);
     EXPECT_EQ(length_, sizeof id);
     EXPECT_EQ(OCINlsEnvironmentVariableGet(nullptr, 2, OCI_NLS_CHARSET_ID, 0, &length_), OCI_ERROR);
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 2, OCI_NLS_DECIMAL, 0, &length_), OCI_ERROR);
