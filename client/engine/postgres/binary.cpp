@@ -61,12 +61,14 @@ std::size_t NumericFrom(const OCINumber& number, char* bytes) noexcept {
 }
 
 int NumericTo(std::string_view bytes, NumericValue& value) noexcept {
+    if (bytes.size() < kHeader) return errors::kInvalidNumber;
     const int count = Get<std::int16_t>(bytes.data());
     const int weight = Get<std::int16_t>(bytes.data() + 2);
     const auto sign = Get<std::uint16_t>(bytes.data() + 4);
     const char* const digits = bytes.data() + kHeader;
     if (sign == kNotANumber) return errors::kInvalidNumber;
     if (sign == kPlusInfinity || sign == kMinusInfinity) return errors::kNumericOverflow;
+    if (count < 0 || bytes.size() < kHeader + 2 * static_cast<std::size_t>(count)) return errors::kInvalidNumber;
     value.is_integer = count <= weight + 1 && weight < 4;    // below 10^16
     if (value.is_integer) {
         value.integer = 0;
