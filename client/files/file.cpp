@@ -107,8 +107,10 @@ Status File::Open(const std::string& name, std::uint32_t mode, std::uint32_t cre
 int File::GiveUpStream() noexcept {
     std::FILE* stream = std::exchange(stream_, nullptr);
     if (!stream) return 0;
+    errno = 0;
     const bool failed = standard_ ? writable_ && std::fflush(stream) != 0 : std::fclose(stream) != 0;
-    return failed ? errno : 0;
+    if (!failed) return 0;
+    return errno != 0 ? errno : EIO;
 }
 
 Status File::Close() {

@@ -158,7 +158,7 @@ std::size_t ShortDate(const date::DateTime& value, char* text) {
 int ModelText(const date::DateTime& value, Workspace& workspace, View& text) {
     std::size_t length = 0;
     char* begin = workspace.small.data();
-    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0) {
+    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0 && value.month <= 12) {
         text = {begin, ShortDate(value, begin)};
         return 0;
     }
