@@ -164,9 +164,10 @@ private:
     [[nodiscard]] std::size_t Month() const { return value_.month - std::size_t{1}; }
     [[nodiscard]] std::size_t Weekday() const { return static_cast<std::size_t>(DayOfWeek(ToDayNumber(value_))); }
 
-    // A model that an element stands for; its switches end with it.
+    // A model that an element stands for; its switches end with it, and FM before it stays on.
     void PutPart(std::string_view model) {
         const bool filled = filled_;
+        if (!filled && model.starts_with("fm")) model.remove_prefix(2);
         error_ = Run(model);    // which are well-formed, but a time alone has no date
         filled_ = filled;
     }
