@@ -225,12 +225,12 @@ private:
 
     void Assign(Span span, const TableColumn* target) {
         NoteObject(span, target);
-        if (!target || !target->concerned || span.Size() == 0 || IsHarmless(span, *target)) return;
         const std::size_t index = span.Size() == 1 ? ParameterOf(pieces_[span.first]) : kNoParameter;
-        if (index != kNoParameter) {
+        if (target && index != kNoParameter && (target->concerned || ObjectKindOf(target->column))) {
             targets_.parameters.push_back({index, target->column, Coercion::Purpose::store});
             return;
         }
+        if (!target || !target->concerned || span.Size() == 0 || IsHarmless(span, *target)) return;
         const std::string quote = IsLongNumber(span) ? "'" : "";
         targets_.edits.push_back(
             {Begin(span.first), End(span.last - 1), "kelp_store(" + quote, quote + Described(*target)});

@@ -1,6 +1,8 @@
 // Making values what a column takes: the cheap tests first, so that a value that fits costs little.
 #include "engine/sqlite/coercion.h"
 
+#include <sqlite3.h>
+
 #include <algorithm>
 #include <array>
 #include <cmath>
@@ -94,6 +96,8 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
 // Without limits nothing is refused for its size.
 Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)), purpose_(purpose) {
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) column_.scale = kFloating;
+    const bool is_large = column_.type == SQLT_CLOB || column_.type == SQLT_DBCLOB || column_.type == SQLT_BLOB;
+    if (is_large) column_.size = column_.characters = 0;    // which are a locator's
     if (purpose == Purpose::store) return;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) column_.type = SQLT_NUM;
     column_.size = column_.characters = 0;
@@ -124,7 +128,7 @@ Status Coercion::Apply(Datum& value) {
     if (IsNumberType(column_.type)) return ApplyNumber(value);
     if (IsDateType(column_.type)) return ApplyDate(value);
     if (IsIntervalType(column_.type)) return ApplyInterval(value);
-    if (column_.type == SQLT_BIN) return ApplyBytes(value);
+    if (column_.type == SQLT_BIN || column_.type == SQLT_LBI || column_.type == SQLT_BLOB) return ApplyBytes(value);
     return ApplyText(value);
 }
 
@@ -155,7 +159,8 @@ Status Coercion::ApplyDigits(Datum& value) {
     const bool limited = scale != kFloating;
     if (value.kind == Kind::decimal) return ApplyDecimal(*static_cast<const OCINumber*>(value.data), value);
     if (value.kind == Kind::integer) {
-        if (!limited || (scale >= 0 && Fits(value.integer, precision - scale))) return {};
+        const bool rounds = column_.type == SQLT_BFLOAT && !Fits(value.integer, precision);
+        if (!rounds && (!limited || (scale >= 0 && Fits(value.integer, precision - scale)))) return {};
         number::FromInt64(value.integer, &number_);
         return ApplyDecimal(number_, value);
     }
@@ -197,15 +202,44 @@ Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {
     return {};
 }
 
-Status Coercion::ApplyText(Datum& value) {
+// As the engine writes numbers that it keeps as texts.
+Status Coercion::WriteNumber(Datum& value) {
+    std::size_t length = 0;
+    text_.resize(number::kMaxPlainText);
     if (value.kind == Kind::decimal) {
-        std::size_t length = 0;
-        text_.resize(number::kMaxPlainText);
         const int failure = number::ToPlainText(*static_cast<const OCINumber*>(value.data), '.', text_.data(), &length);
         if (failure != 0) return Refuse(failure);
-        Set(value, Kind::text, text_.data(), length);
+    } else {
+        const auto room = static_cast<int>(text_.size());
+        if (value.kind == Kind::integer) sqlite3_snprintf(room, text_.data(), "%lld", static_cast<long long>(value.integer));
+        else sqlite3_snprintf(room, text_.data(), "%!.15g", value.real);
+        length = std::strlen(text_.data());
     }
-    if (value.kind == Kind::timestamp) SetDate(value.Timestamp(), value);
+    Set(value, Kind::text, text_.data(), length);
+    return {};
+}
+
+void Coercion::WriteBytes(Datum& value) {
+    constexpr std::string_view kDigits = "0123456789ABCDEF";
+    text_.clear();
+    for (const char byte : value.Text()) {
+        text_.push_back(kDigits[static_cast<unsigned char>(byte) >> 4]);
+        text_.push_back(kDigits[static_cast<unsigned char>(byte) & 15]);
+    }
+    Set(value, Kind::text, text_.data(), text_.size());
+}
+
+Status Coercion::ApplyText(Datum& value) {
+    switch (value.kind) {
+        case Kind::integer:
+        case Kind::real:
+        case Kind::decimal:
+            if (Status status = WriteNumber(value); status.Failed()) return status;
+            break;
+        case Kind::bytes: WriteBytes(value); break;
+        case Kind::timestamp: SetDate(value.Timestamp(), value); break;
+        default: break;
+    }
     // Blanks at the end of a fixed column's text come back when it is read.
     if (column_.type == SQLT_AFC && value.kind == Kind::text) {
         while (value.length > 1 && value.Text().back() == ' ') --value.length;
@@ -214,6 +248,7 @@ Status Coercion::ApplyText(Datum& value) {
 }
 
 Status Coercion::ApplyBytes(Datum& value) {
+    if (value.kind == Kind::lob) return {};
     if (value.kind == Kind::text) {
         const std::string_view digits = value.Text();
         if (digits.size() % 2 != 0) return Refuse(errors::kBadHexadecimal);

@@ -32,6 +32,8 @@ private:
     Status ApplyDigits(Datum& value);
     Status ApplyDecimal(const OCINumber& number, Datum& value);
     Status ApplyText(Datum& value);
+    Status WriteNumber(Datum& value);
+    void WriteBytes(Datum& value);
     Status ApplyBytes(Datum& value);
     Status ApplyDate(Datum& value);
     Status ApplyInterval(Datum& value);

@@ -41,7 +41,9 @@ constexpr TypeRow kTypes[] = {
     {"decimal", SQLT_NUM, Measure::digits, 22, 38, 0},
     {"decfloat(16", SQLT_BFLOAT, Measure::none, 8, 16, kFloating},
     {"decfloat", SQLT_BDOUBLE, Measure::none, 16, 34, kFloating},
-    {"kelp_decfloat(16", SQLT_BFLOAT, Measure::none, 8, 16, kFloating},
+    {"kelp_decfp(16", SQLT_BFLOAT, Measure::none, 8, 16, kFloating},
+    {"kelp_decfp", SQLT_BDOUBLE, Measure::none, 16, 34, kFloating},
+    {"kelp_decfloat(16", SQLT_BFLOAT, Measure::none, 8, 16, kFloating},    // in files of before
     {"kelp_decfloat", SQLT_BDOUBLE, Measure::none, 16, 34, kFloating},
     {"dec", SQLT_NUM, Measure::digits, 22, 38, 0},
     {"integer", SQLT_NUM, Measure::none, 22, 38, 0},

@@ -17,7 +17,7 @@ constexpr const char* kRelease = "23.1";
 
 // Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
 constexpr Dialect::Spelling kTypes[] = {
-    {"decfloat", "kelp_decfloat"},    // without "floa", which would make every value a real
+    {"decfloat", "kelp_decfp"},    // without "floa", which would make every value a real
     {"long raw", "long raw"},
     {"long", "long varchar"},
     {"timestamp with local time zone", "timestamp_ltz"},

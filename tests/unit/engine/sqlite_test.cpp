@@ -51,8 +51,8 @@ TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
 // The same value through a placeholder, as a literal, from a query and by an update.
 TEST_F(Sqlite, ColumnsTakeWhatTheirDeclarationSays) {
     MustRun("create table t(n number(5,2), w number(3,-2), i integer, f number, v varchar2(3), c char(4), d date, "
-            "s timestamp, r raw(2), x kelp_decfloat(16), b clob, e number(18), z number(2,3), u varchar2(40), "
-            "y kelp_decfloat(34), q timestamp with time zone, l span_ym(2), o span_ds(1,2))");
+            "s timestamp, r raw(2), x kelp_decfp(16), b clob, e number(18), z number(2,3), u varchar2(40), "
+            "y kelp_decfp(34), q timestamp with time zone, l span_ym(2), o span_ds(1,2))");
     const struct { const char* column; const char* literal; const char* outcome; } cases[] = {
         {"n", "'12.345'", "real 12.35"}, {"n", "999.99", "real 999.99"}, {"n", "999.995", "error 1438"},
         {"n", "-1000", "error 1438"}, {"n", "'abc'", "error 1722"}, {"n", "x'01'", "error 932"}, {"n", "7", "7"},
@@ -153,7 +153,7 @@ TEST_F(Sqlite, RowIdOfAChangeIsOfItsTable) {
 
 TEST_F(Sqlite, ColumnsAreDescribed) {
     ASSERT_EQ(Run("create table t(a number(12,2) not null, b varchar2(20), c CHAR  ( 5 ), d timestamp_tz(3), "
-                  "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfloat(34), i number(5), "
+                  "e number, f clob, g \"odd type\", id integer primary key, h kelp_decfp(34), i number(5), "
                   "j float(63), k float(200), l number(50,-90), m timestamp(12), n double  precision)"), 0);
     const auto query = Prepared("select a, b as \"Mixed\", c, d, e, f, g, id, h, i, j, k, l, m, n, 1+1, cast(a as blob), rowid, "
                                "kelp_varchar(kelp_decfloat(e , 16) , 9) || 'x', kelp_varchar(ifnull(b, 'x'), 9), count(kelp_date(b )) from t");
