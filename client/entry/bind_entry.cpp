@@ -8,28 +8,28 @@ namespace {
 
 // The forms of a call differ in the width of sizes and lengths alone.
 sword BindByName(OCIStmt* stmt, OCIBind** bind, OCIError* err, const OraText* name, sb4 length,
-                 const Statement::BindArguments& arguments) {
+                 const Statement::BindArguments& arguments, const char* function = __builtin_FUNCTION()) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
         if (!name) return Error(errors::kNoSuchBind);
         // A length below 0 asks to measure the name.
         const std::size_t measured = length < 0 ? TextLength(statement.Env(), name) : static_cast<std::size_t>(length);
         const CallText text(statement.Env(), name, measured, false);
         return text.Valid() ? statement.BindByName(bind, text.View(), arguments) : Error(errors::kBadText);
-    });
+    }, function);
 }
 
 sword BindByPosition(OCIStmt* stmt, OCIBind** bind, OCIError* err, ub4 position,
-                     const Statement::BindArguments& arguments) {
+                     const Statement::BindArguments& arguments, const char* function = __builtin_FUNCTION()) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
         return statement.BindByPosition(bind, position, arguments);
-    });
+    }, function);
 }
 
 sword DefineByPosition(OCIStmt* stmt, OCIDefine** def, OCIError* err, ub4 position, const AreaArguments& arguments,
-                       ub4 mode) {
+                       ub4 mode, const char* function = __builtin_FUNCTION()) {
     return Enter<Statement>(stmt, err, [&](Statement& statement) {
         return statement.DefineByPosition(def, position, arguments, mode);
-    });
+    }, function);
 }
 
 // Steps of an array of structures, for a bind or a define.

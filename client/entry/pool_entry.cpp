@@ -50,20 +50,20 @@ Status CreatePool(PoolHandle& handle, const PoolTexts& texts, PoolHandle::Reques
 
 // The pool handle must be of the environment: the names of pools are.
 template <class P, class Body>
-sword EnterPool(OCIEnv* env, void* pool, OCIError* err, Body body) noexcept {
+sword EnterPool(OCIEnv* env, void* pool, OCIError* err, Body body, const char* name = __builtin_FUNCTION()) noexcept {
     return EnterUnlocked<Environment>(env, err, [&](Environment& environment) {
         P* handle = Live<P>(pool);
         const LongCall may_take_long;
         return handle && &handle->Env() == &environment ? body(*handle) : InvalidHandle();
-    });
+    }, name);
 }
 
 template <class P>
-sword DestroyPool(void* pool, OCIError* err, ub4 mode, ub4 force) noexcept {
+sword DestroyPool(void* pool, OCIError* err, ub4 mode, ub4 force, const char* name = __builtin_FUNCTION()) noexcept {
     return EnterUnlocked<P>(pool, err, [&](P& handle) {
         const LongCall may_take_long;
         return mode & ~force ? Error(errors::kBadPoolDestroyMode) : handle.DestroyPool(mode != OCI_DEFAULT);
-    });
+    }, name);
 }
 
 // ---- Getting a session

@@ -9,18 +9,19 @@
 namespace {
 
 template <class Body>
-sword EnterSession(OCISvcCtx* svc, OCIError* err, Body body) noexcept {
+sword EnterSession(OCISvcCtx* svc, OCIError* err, Body body, const char* name = __builtin_FUNCTION()) noexcept {
     return EnterUnlocked<ServiceContext>(svc, err, [&](ServiceContext& service) -> Status {
         const LongCall may_take_long;
         const SessionTurn turn(service);
         return turn.link ? body(service, *turn.link) : turn.status;
-    });
+    }, name);
 }
 
 // A call whose one argument is flags.
 sword EnterWithFlags(OCISvcCtx* svc, OCIError* err, ub4 flags,
-                     Status (*call)(ServiceContext& service, Link& link, std::uint32_t flags)) noexcept {
-    return EnterSession(svc, err, [&](ServiceContext& service, Link& link) { return call(service, link, flags); });
+                     Status (*call)(ServiceContext& service, Link& link, std::uint32_t flags),
+                     const char* name = __builtin_FUNCTION()) noexcept {
+    return EnterSession(svc, err, [&](ServiceContext& service, Link& link) { return call(service, link, flags); }, name);
 }
 
 }  // namespace
@@ -63,7 +64,7 @@ bool Collect(OCITrans** txns, OCIError** errs, std::span<PreparedBranch> branche
     for (PreparedBranch& branch : branches) {
         branch = {Live<TransactionHandle>(*txns++), Live<ErrorHandle>(*errs++)};
         if (!branch.handle || !branch.error) return false;
-        branch.error->list.Clear();
+        branch.error->Begin("OCITransMultiPrepare");
     }
     return true;
 }
