@@ -252,6 +252,23 @@ TEST_F(Lobs, ValuesThatAreTrimmedAreOthers) {
     }
 }
 
+// An open query shows the value as it was; what waits to become one goes with the savepoint it came after.
+TEST_F(Lobs, WhatGrowsIsNewToOthersAndGoesBackWithItsSavepoint) {
+    MustRun("insert into l select 2, c, b from l", "insert into l select 3, c, b from l where k = 1", "commit", "savepoint s");
+    Fetch(lob, "select c from l where k = 3 for update");
+    char text[40] = "";
+    MUST(Query("select c || '.' from l", {Text(text)}), Write(lob, 12, " and more"));
+    OCIStmt* const query = std::exchange(stmt, New<OCIStmt>(OCI_HTYPE_STMT));
+    MustRun("update l set b = x'04' where k = 1");
+    EXPECT_EQ(One("select c from l where k = 3"), "h\xC3\xA4llo world and more");
+    OCIStmt* const change = std::exchange(stmt, query);
+    MUST(StatementTest::Fetch(), StatementTest::Fetch());
+    EXPECT_STREQ(text, "h\xC3\xA4llo world.");
+    stmt = change;
+    MUST(Write(lob, 21, " and more"), Run("rollback to s"), Run("commit"));
+    EXPECT_EQ(One("select c from l where k = 3"), "h\xC3\xA4llo world");
+}
+
 TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
     MustRun("create table n(k integer, c clob)", "insert into n values(1, '" + std::string(50000, 'a') + "')",
             "insert into n values(2, '" + std::string(50000, 'b') + "')");

@@ -90,6 +90,8 @@ TEST_F(Executing, RowsThatFail) {
     auto* const other = New<OCIError>(OCI_HTYPE_ERROR);
     EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, 0), OCI_SUCCESS);
     EXPECT_NE(row, err);
+    EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, 1), OCI_SUCCESS);
+    EXPECT_EQ(OCIErrorGet(row, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA) << "what it told before is gone";
     EXPECT_EQ((StatementCalls{env, other}.Answer(OCIParamGet(err, OCI_HTYPE_ERROR, other, nullptr, 0))), 21560);
     EXPECT_EQ(BatchErrors(), "1 in 1, 1 in 3, ");
 }
