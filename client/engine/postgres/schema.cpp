@@ -107,7 +107,7 @@ create or replace function kelp.months_between(timestamp, timestamp) returns num
 return (extract(year from $1) - extract(year from $2)) * 12 + extract(month from $1) - extract(month from $2)
     + case when extract(day from $1) = extract(day from $2) or ($1 = kelp.last_day($1) and $2 = kelp.last_day($2)) then 0
            else kelp.days_between($1 - (date_trunc('month', $1) - date_trunc('month', $2)), $2) / 31 end;
-create or replace function kelp.next_day(day timestamp, name text) returns kelp.date stable parallel safe
+create or replace function kelp.next_day(day timestamp, name text) returns kelp.date stable strict parallel safe
 language plpgsql as $$
 begin
     for ahead in 1..7 loop
@@ -120,7 +120,7 @@ begin
 end $$;
 create or replace function kelp.trunc(timestamp) returns kelp.date immutable parallel safe language sql
 return date_trunc('day', $1);
-create or replace function kelp.trunc(day timestamp, unit text) returns kelp.date immutable parallel safe
+create or replace function kelp.trunc(day timestamp, unit text) returns kelp.date immutable strict parallel safe
 language plpgsql as $$
 begin
     return case upper(unit)
@@ -268,7 +268,7 @@ begin
         end;
     end loop;
 end $$;
-comment on schema kelp is 'libkelpci 3';
+comment on schema kelp is 'libkelpci 4';
 commit;
 )sql";
 
