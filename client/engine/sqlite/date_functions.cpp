@@ -1,4 +1,4 @@
-// Functions of dates, and trunc, which is one of numbers, too. A null argument makes a null; results are dates without
+// Functions of dates, and trunc, which is one of numbers, too, as its sister round is. A null argument makes a null; results are dates without
 // fraction and zone.
 #include <algorithm>
 #include <string>
@@ -162,6 +162,21 @@ int CutDate(std::string_view unit, date::DateTime& value) {
     return row == std::end(kUnits) ? errors::kBadUnit : row->cut(value);
 }
 
+// A number cut or rounded to places behind the point, or before it; to whole ones without the second argument.
+template <auto operation>
+void ToPlaces(sqlite3_context* context, int count, Arguments arguments) {
+    if (AnyNull(count, arguments)) return sqlite3_result_null(context);
+    OCINumber number;
+    std::int64_t places = 0;
+    int failure = ReadNumber(arguments[0], number);
+    if (failure == 0 && count > 1) failure = ReadWhole(arguments[1], places);
+    constexpr std::int64_t kMostPlaces = 130;
+    places = std::clamp(places, -kMostPlaces, kMostPlaces);
+    if (failure == 0) failure = operation(number, static_cast<int>(places), &number);
+    if (failure != 0) return Refuse(context, failure);
+    ReturnNumber(context, number);
+}
+
 // trunc(date), trunc(date, unit), trunc(number), trunc(number, places). With a unit any text is to be a date.
 void Trunc(sqlite3_context* context, int count, Arguments arguments) {
     if (AnyNull(count, arguments)) return sqlite3_result_null(context);
@@ -172,15 +187,7 @@ void Trunc(sqlite3_context* context, int count, Arguments arguments) {
         if (failure == 0) failure = CutDate(count > 1 ? TextOf(arguments[1]) : "dd", date);
         return ReturnWholeDate(context, date, failure);
     }
-    OCINumber number;
-    std::int64_t places = 0;
-    int failure = ReadNumber(arguments[0], number);
-    if (failure == 0 && count > 1) failure = ReadWhole(arguments[1], places);
-    constexpr std::int64_t kMostPlaces = 130;
-    places = std::clamp(places, -kMostPlaces, kMostPlaces);
-    if (failure == 0) failure = number::Trunc(number, static_cast<int>(places), &number);
-    if (failure != 0) return Refuse(context, failure);
-    ReturnNumber(context, number);
+    ToPlaces<number::Trunc>(context, count, arguments);
 }
 
 constexpr FunctionRow kRows[] = {
@@ -189,6 +196,7 @@ constexpr FunctionRow kRows[] = {
     {"next_day", 2, 2, SQLITE_DETERMINISTIC, NextDay, "date"},
     {"months_between", 2, 2, SQLITE_DETERMINISTIC, MonthsBetweenDates, "number"},
     {"trunc", 1, 2, SQLITE_DETERMINISTIC, Trunc, "", 1},
+    {"round", 1, 2, SQLITE_DETERMINISTIC, ToPlaces<number::Round>, "number"},
 };
 
 }  // namespace

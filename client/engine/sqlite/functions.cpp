@@ -213,7 +213,7 @@ constexpr struct {
     ResultType result;
 } kEngineFunctions[] = {
     {"count", {"number"}}, {"sum", {"number"}}, {"total", {"number"}}, {"avg", {"number"}},
-    {"abs", {"number"}},   {"round", {"number"}}, {"length", {"number"}}, {"row_number", {"number"}},
+    {"abs", {"number"}},   {"length", {"number"}}, {"row_number", {"number"}},
     {"rank", {"number"}},  {"dense_rank", {"number"}}, {"max", {"", 1}}, {"min", {"", 1}},
 };
 
