@@ -85,8 +85,9 @@ private:
                                             [](const Placeholder& p, std::size_t begin) { return p.begin < begin; });
         result_.placeholders.push_back(static_cast<std::uint32_t>(found - all.begin()));
         const bool has_indicator = IsIndicator(tokens_, index + 1);
-        Replace(token, tokens_[index + has_indicator].End(),
-                dialect_.placeholder(result_.placeholders.size()));
+        const std::size_t end = tokens_[index + has_indicator].End();
+        const bool runs_on = tokens_[index + 1].kind == TokenKind::number && tokens_[index + 1].begin == end;    // ?5
+        Replace(token, end, dialect_.placeholder(result_.placeholders.size()) + (runs_on ? " " : ""));
         return index + 1 + has_indicator;
     }
 

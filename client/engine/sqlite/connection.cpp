@@ -59,6 +59,15 @@ private:
     sqlite3_stmt* const statement_;
 };
 
+// A parameter in a spelling of SQLite alone (@a, $a), to which nobody could give a value; null for none.
+const char* OwnParameter(sqlite3_stmt* statement) {
+    for (int index = sqlite3_bind_parameter_count(statement); index > 0; --index) {
+        const char* name = sqlite3_bind_parameter_name(statement, index);
+        if (name && *name != '?') return name;
+    }
+    return nullptr;
+}
+
 }  // namespace
 
 // While one lives, nothing stops the call that runs: it ends or undoes.
@@ -169,6 +178,7 @@ Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint
         return Error(errors::kNotProperlyEnded).From("SQLITE");
     }
     if (code != SQLITE_OK) return Failure(database, code);
+    if (const char* name = OwnParameter(made.statement.get())) return Error(errors::kInvalidCharacter, name).From("SQLITE");
 
     if (Status status = FindValueTargets(database, sql, HasIntervals(), made.targets); status.Failed()) return status;
     if (utf8_) made.objects = FindObjectTargets(database, made.targets, lobs_);
