@@ -81,8 +81,10 @@ constexpr WordsRow kWords[] = {
     {"not authorized", "", errors::kInsufficientPrivileges},
     {"cannot modify", "", errors::kInsufficientPrivileges},
     {"cannot commit", "", 54},
+    {"use DROP ", "", errors::kNoSuchTable},    // of another kind
+    {"cannot join using column", "", errors::kInvalidIdentifier},
+    {"there is already a", "", errors::kNameInUse},
     {"", "already exists", errors::kNameInUse},
-    {"", "already another table or index", errors::kNameInUse},
     {"", "may not be dropped", errors::kInsufficientPrivileges},
     {"", "may not be modified", errors::kInsufficientPrivileges},
     {"", "has no column named", errors::kInvalidIdentifier},
