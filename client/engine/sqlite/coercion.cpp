@@ -115,7 +115,6 @@ bool Coercion::Concerns(const Column& column) {
         case SQLT_CLOB:
         case SQLT_DBCLOB:
         case SQLT_BLOB:
-        case SQLT_LBI:
         case SQLT_FILE:
         case SQLT_RDD: return false;
         default: return true;

@@ -18,6 +18,7 @@ constexpr const char* kRelease = "23.1";
 // Words that SQLite has others for. What it keeps as it is written stays: it remembers the declared words of a column.
 constexpr Dialect::Spelling kTypes[] = {
     {"decfloat", "kelp_decfp"},    // without "floa", which would make every value a real
+    {"string", "varchar"},    // SQLite would keep numbers that are written in one as numbers
     {"long raw", "long raw"},
     {"long", "long varchar"},
     {"timestamp with local time zone", "timestamp_ltz"},
