@@ -345,8 +345,9 @@ Status PgLobStore::HasWritten(const RowVersion& version, bool& written) {
     const Question question({PlaceText(version), std::to_string(version.transaction)});
     Result found;
     Status status = connection_.AskGuarded(
-        "select pg_catalog.txid_status(n + (($2::bigint - n + 2147483648) & 4294967295) - 2147483648) = 'in progress'"
-        " from only " + table->name + ", pg_catalog.txid_current_if_assigned() n"
+        "select pg_catalog.txid_status(kelp_now + (($2::bigint - kelp_now + 2147483648) & 4294967295) - 2147483648) = "
+        "'in progress'"
+        " from only " + table->name + ", pg_catalog.txid_current_if_assigned() kelp_now"
             " where ctid = $1::tid and xmin = ($2::bigint)::text::xid",
         question.values, found);
     if (!status.Ok()) return status;
