@@ -212,7 +212,8 @@ Status PgConnection::ReadTable(Oid table, Table& read) {
     const std::string number = std::to_string(table);
     Result result;
     Status status = AskGuarded(
-        "select a.attnum::text, pg_catalog.format('%I', a.attname), a.attname, a.attnotnull::text, a.atttypmod::text,"
+        "select a.attnum::text, pg_catalog.format('%I', a.attname), a.attname, a.attnotnull::text,"
+        " case when t.typtype = 'd' then t.typtypmod else a.atttypmod end::text,"
         " case when t.typtype = 'd' then t.typbasetype else t.oid end::text,"
         " case when t.typnamespace = pg_catalog.to_regnamespace('kelp') or (t.typname = 'lo' and t.typbasetype = 26)"
         " then t.typname else '' end,"
