@@ -106,7 +106,18 @@ private:
     void CompareEach(Span subject, const std::vector<Span>& others) {
         for (const Span other : others) Compare(subject, other);
         const Span bare = operands_.Bare(subject);
-        if (operands_.IsValue(bare)) CheckTypes(others, PlainText(At(bare.first)).ends_with(' '));
+        if (!operands_.IsValue(bare)) return;
+        CheckTypes(others, PlainText(At(bare.first)).ends_with(' '));
+        UseBeside(others);
+    }
+
+    // A value that is read as a column's meets other values: they are read alike.
+    void UseBeside(const std::vector<Span>& others) {
+        const TableColumn* column = nullptr;
+        for (const Span other : others)
+            if (!column) column = ConcerningType(other);
+        if (!column) return;
+        for (const Span other : others) Use(other, *column);
     }
 
     // A value is read in one way only: it cannot be compared with a date or a raw, or with blanks at its end with fixed
