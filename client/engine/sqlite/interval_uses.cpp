@@ -71,7 +71,7 @@ private:
             return casts ? Span{at, operands_.Partner(last) + 1} : Span{};
         }
         while (At(last) == "." && IsName(At(last + 1))) last += 2;
-        return {at, last};
+        return At(last) == "." ? Span{} : Span{at, last};    // of a table whose columns are all named
     }
 
     // The word that begins the list which `at` stands in, or its parenthesis; kNone when there is neither.
