@@ -112,7 +112,9 @@ int ToWeekFrom(date::DateTime& value, date::DayNumber first) {
 
 int ToCentury(date::DateTime& value) {
     const int year = value.year;
-    value.year = static_cast<std::int16_t>(year > 0 ? (year - 1) / 100 * 100 + 1 : -((-year + 99) / 100 * 100));
+    const int first = year > 0 ? (year - 1) / 100 * 100 + 1 : -((-year + 99) / 100 * 100);
+    if (first < date::kMinYear) return errors::kBadYear;
+    value.year = static_cast<std::int16_t>(first);
     return ToDayOf(value, 1, 1);
 }
 int ToYear(date::DateTime& value) { return ToDayOf(value, 1, 1); }

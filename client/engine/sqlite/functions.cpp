@@ -93,7 +93,7 @@ template <bool whole_seconds>
 void ToDate(sqlite3_context* context, int count, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
     date::DateTime value;
-    int failure = date::FromEngineText(TextOf(arguments[0]), &value);
+    int failure = ReadDate(arguments[0], value);
     if (whole_seconds) {
         value.nanosecond = 0;
         value.has_zone = false;
