@@ -65,7 +65,8 @@ public:
         ++length_;
     }
     void Put(std::string_view run) {
-        if (length_ < capacity_) std::memcpy(text_ + length_, run.data(), std::min(run.size(), capacity_ - length_));
+        if (!run.empty() && length_ < capacity_)  // an empty one may have no address
+            std::memcpy(text_ + length_, run.data(), std::min(run.size(), capacity_ - length_));
         length_ += run.size();
     }
     void Repeat(char c, std::ptrdiff_t count) {
