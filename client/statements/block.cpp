@@ -17,16 +17,21 @@ namespace {
 
 // What a savepoint step does.
 struct SavepointStep {
-    bool sets = false;    // else goes back to one, or releases it
+    enum class Verb : std::uint8_t { sets, goes_back, releases };
+    Verb verb = Verb::goes_back;
     std::string name;
 };
-SavepointStep ReadSavepoint(std::string_view step) {
+// To some engines a name in quotes is the one without, in either letter case; to others it is another one.
+SavepointStep ReadSavepoint(std::string_view step, bool quotes_matter) {
     SavepointStep read;
     sql::Tokenizer tokens(step);
     sql::Token token = tokens.Next();
-    read.sets = token.Is("savepoint");
-    for (; token.kind == sql::TokenKind::word || token.kind == sql::TokenKind::quoted_word; token = tokens.Next())
-        read.name = sql::UpperCase(sql::PlaceholderName(token.text));    // quoted or not is one to the engine
+    if (token.Is("savepoint")) read.verb = SavepointStep::Verb::sets;
+    if (token.Is("release")) read.verb = SavepointStep::Verb::releases;
+    for (; token.kind == sql::TokenKind::word || token.kind == sql::TokenKind::quoted_word; token = tokens.Next()) {
+        read.name = sql::PlaceholderName(token.text);
+        if (!quotes_matter) read.name = sql::UpperCase(read.name);
+    }
     return read;
 }
 
@@ -59,8 +64,9 @@ public:
     // what follows gets another.
     void Note(SavepointStep&& step) noexcept {
         const auto found = std::find(savepoints_.rbegin(), savepoints_.rend(), step.name);
-        if (step.sets) savepoints_.push_back(std::move(step.name));
-        else if (found != savepoints_.rend()) savepoints_.erase(found.base(), savepoints_.end());
+        const bool releases = step.verb == SavepointStep::Verb::releases;
+        if (step.verb == SavepointStep::Verb::sets) savepoints_.push_back(std::move(step.name));
+        else if (found != savepoints_.rend()) savepoints_.erase(found.base() - releases, savepoints_.end());
         else begun_ = false;
         if (!begun_) savepoints_.clear();
     }
@@ -145,7 +151,8 @@ Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {
 }
 
 Status Statement::Savepoint(Compiled& compiled, const sql::Step& step, ub4 row, Stretch& stretch) {
-    SavepointStep read = ReadSavepoint(std::string_view(text_.Text()).substr(step.begin));
+    const bool quotes_matter = UsedLink()->Database().GetDialect().quoted_name != nullptr;
+    SavepointStep read = ReadSavepoint(std::string_view(text_.Text()).substr(step.begin), quotes_matter);
     stretch.Reserve();
     Status status = Change(compiled, step, row, 0);
     if (status.Ok()) stretch.Note(std::move(read));
