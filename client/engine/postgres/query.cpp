@@ -218,7 +218,8 @@ Status PgQuery::DescribeColumns(const PGresult* result) {
         const auto place = static_cast<std::size_t>(index);
         const Oid type = PQftype(result, index);
         DescribeType(type, PQfmod(result, index), columns_[place]);
-        columns_[place].name = type == oid::kTupleId ? "ROWID" : ShownName(PQfname(result, index));
+        const std::string_view name = PQfname(result, index);
+        columns_[place].name = name == "ctid" ? "ROWID" : ShownName(name);
         readers_[place] = binary_ ? BinaryReader(type) : TextReader(type);
         if (const Reader reader = IntervalReader(columns_[place], binary_)) readers_[place] = reader;
         const Oid table = PQftable(result, index);
