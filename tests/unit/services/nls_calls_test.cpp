@@ -71,12 +71,13 @@ TEST_F(NlsCalls, NamesAndSettings) {
     EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), 4, 871), OCI_ERROR);
     const struct { ub2 item; const char* text; } items[] = {
         {1, "Sunday"}, {7, "Saturday"}, {8, "Sun"}, {14, "Sat"}, {15, "January"}, {26, "December"}, {27, "Jan"},
-        {38, "Dec"}, {OCI_NLS_DECIMAL, "."}, {OCI_NLS_CHARACTER_SET, "WE8MSWIN1252"}};
+        {38, "Dec"}, {41, "AM"}, {42, "PM"}, {43, "AD"}, {44, "BC"}, {45, "."}, {46, ","}, {49, "DD-MON-RR"},
+        {50, "AMERICA"}, {51, "$"}, {52, "AMERICAN"}, {54, "AMERICA"}, {55, "WE8MSWIN1252"}};
     for (const auto& c : items) {
         EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, c.item)), 0);
         EXPECT_STREQ(text, c.text);
     }
-    for (const ub2 item : {0, 39}) EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, item)), 12702);
+    for (const ub2 item : {0, 39, 40, 47, 53, 56, 91}) EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), sizeof text, item)), 12702);
     EXPECT_EQ(Answer(OCINlsGetInfo(env_, err_, Text(text), 6, 1)), 22059);
     EXPECT_EQ(OCINlsCharSetNameToId(env_, nullptr), 0);
     const struct { ub2 item; sb4 value; } numbers[] = {{91, 1}, {92, 1}, {93, 178}, {94, 1000}};
