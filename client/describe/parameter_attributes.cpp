@@ -34,7 +34,9 @@ Status Keep(const Parameter& parameter, std::string_view text, AttributeValue& v
 bool IsCharacters(const engine::Column& column) {
     return column.type == SQLT_CHR || column.type == SQLT_AFC || column.type == SQLT_LNG;
 }
-bool HasCharacterSet(const engine::Column& column) { return IsCharacters(column) || column.type == SQLT_CLOB; }
+bool HasCharacterSet(const engine::Column& column) {
+    return IsCharacters(column) || column.type == SQLT_CLOB || column.type == SQLT_DBCLOB;
+}
 bool IsTimestamp(const engine::Column& column) {
     return column.type == SQLT_TIMESTAMP || column.type == SQLT_TIMESTAMP_TZ || column.type == SQLT_TIMESTAMP_LTZ;
 }
@@ -102,6 +104,8 @@ Status DisplaySize(Parameter& parameter, AttributeValue& value) {
     const engine::Column& column = Column(parameter);
     switch (column.type) {
         case SQLT_NUM:
+        case SQLT_BFLOAT:
+        case SQLT_BDOUBLE:
         case SQLT_IBFLOAT:
         case SQLT_IBDOUBLE: value.integer = kNumber; break;
         case SQLT_DAT: value.integer = kDate; break;
@@ -122,7 +126,8 @@ Status DisplaySize(Parameter& parameter, AttributeValue& value) {
 }
 Status CharacterForm(Parameter& parameter, AttributeValue& value) {
     const engine::Column& column = Column(parameter);
-    if (HasCharacterSet(column)) value.integer = column.national ? SQLCS_NCHAR : SQLCS_IMPLICIT;
+    const bool national = column.national || column.type == SQLT_DBCLOB;
+    if (HasCharacterSet(column)) value.integer = national ? SQLCS_NCHAR : SQLCS_IMPLICIT;
     return {};
 }
 Status CharacterSet(Parameter& parameter, AttributeValue& value) {
