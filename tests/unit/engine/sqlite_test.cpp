@@ -194,50 +194,19 @@ TEST_F(Sqlite, CastsKeepDigitsAndDates) {
     for (const auto& c : cases) EXPECT_EQ(Query(c.sql, {Decimal(pi)}), c.rows) << c.sql;
 }
 
-TEST_F(Sqlite, FunctionsOfDatesNumbersAndText) {
+TEST_F(Sqlite, FunctionsOfNumbersAndText) {
     const struct { const char* list; const char* row; } cases[] = {
-        {"to_char('2024-02-09 13:14:15'), to_char('2024-02-09 13:14:15', 'YYYY/MM/DD HH24:MI')",
-         "09-FEB-24,2024/02/09 13:14;"},
         {"to_char(1234.5, '9,999.00'), to_char(0.5), to_char('abc'), to_char(99.96, '99.9'), to_char(null, '9')",
          " 1,234.50,.5,abc,#####,null;"}, 
         {"to_char('10:20:30'), to_char(to_timestamp('090224 5', 'DDMMRR FF'))", "10:20:30,09-FEB-24 12.00.00.500000 AM;"},
         {"to_char('x', '99')", "error 1722"}, {"to_char(1, 'Q')", "error 1481"},
-        {"to_date('09.02.2024', 'DD.MM.YYYY'), to_date('9-feb-24')",
-         "time 2024-02-09 00:00:00,time 2024-02-09 00:00:00;"},
-        {"to_date('2024-13-01', 'YYYY-MM-DD')", "error 1843"}, {"to_date('x', 'YYYY')", "error 1858"},
-        {"to_timestamp('090224 5', 'DDMMRR FF')", "time 2024-02-09 00:00:00.5;"},
-        {"to_date('2024 5', 'YYYY FF')", "error 1821"}, {"to_date('2024-02-30')", "error 1839"}, {"to_date('x')", "error 1858"},
-        {"to_date('2024-02-09 01:02:03.5'), trunc('9-feb-24', 'mm')", "time 2024-02-09 01:02:03,2024-02-01 00:00:00;"},
         {"to_number('-1.50'), to_number('1,234', '9,999'), to_number(null)", "real -1.5,1234,null;"},
         {"to_number('1x')", "error 1722"}, {"to_number('1x', '99')", "error 1722"},
-        {"add_months('2024-01-31 10:00:00', 1), add_months('2024-02-29', -12)",
-         "time 2024-02-29 10:00:00,time 2023-02-28 00:00:00;"},
-        {"add_months('2024-01-31', 1000000)", "error 1841"}, {"add_months('x', 1)", "error 1858"},
-        {"add_months('2024-01-31', 'x')", "error 1722"}, {"add_months(5, 1)", "error 932"},
-        {"add_months('10:00:00', 1)", "error 932"},
-        {"months_between('2024-03-31', '2024-02-29'), months_between('2024-01-01', '2024-02-17'),"
-         " months_between('0001-01-05', '-0001-01-05')", "1,decimal -1.51612903225806451612903225806451612903,12;"},
-        {"last_day('2024-02-01 01:02:03'), next_day('2024-02-09', 'friday'), next_day('2024-02-09', 1)",
-         "time 2024-02-29 01:02:03,time 2024-02-16 00:00:00,time 2024-02-11 00:00:00;"},
-        {"next_day('2024-02-09', 'nonday')", "error 1846"}, {"next_day('2024-02-09', 8)", "error 1846"},
-        {"next_day('2024-02-09', 0)", "error 1846"},
-        {"next_day('2024-02-09', 7), next_day('x', 1)", "error 1858"},
-        {"next_day('2024-02-09', 7)", "time 2024-02-10 00:00:00;"},
-        {"next_day('10:00:00', 'friday')", "error 932"},
         {"trunc(2.79), trunc(-2.79, 1), trunc(1279, -2), trunc('5.5')", "2,real -2.7,1200,5;"},
-        {"trunc('2024-02-09 13:14:15'), trunc(to_date('09-02-24', 'DD-MM-YY'), 'yyyy')",
-         "2024-02-09 00:00:00,time 2024-01-01 00:00:00;"},
-        {"trunc('2024-08-15 13:14:15', 'q'), trunc('2024-08-15', 'iw'), trunc('2024-08-15', 'd'),"
-         " trunc('2024-08-15', 'ww'), trunc('2024-08-15', 'w'), trunc('2000-08-15', 'cc')",
-         "2024-07-01 00:00:00,2024-08-12 00:00:00,2024-08-11 00:00:00,2024-08-12 00:00:00,2024-08-15 00:00:00,"
-         "1901-01-01 00:00:00;"},
-        {"trunc('2024-08-15 13:14:15', 'hh'), trunc('2024-08-15 13:14:15', 'mi'), trunc('-0150-08-15', 'cc'), trunc('2001-08-15', 'cc')",
-         "2024-08-15 13:00:00,2024-08-15 13:14:00,-0200-01-01 00:00:00,2001-01-01 00:00:00;"},
-        {"trunc('2024-08-15', 'xx')", "error 1898"}, {"trunc(x'01')", "error 1722"},
+        {"trunc(x'01')", "error 1722"},
         {"hextoraw('abc'), hextoraw('a'), rawtohex(x'0aff'), rawtohex('A'), length(empty_clob()), length(empty_blob())",
          "bytes 0abc,bytes 0a,0AFF,41,0,0;"}, {"hextoraw('0g')", "error 1465"}, {"hextoraw('0@')", "error 1465"},
         {"rawtohex(5)", "error 932"}, {"lpad('x', 1e19)", "error 1426"},
-        {"months_between('2024-03-10 12:00:00', '2024-02-09')", "decimal 1.0483870967741935483870967741935483871;"},
         {"decode(2, 1, 'a', 2, 'b'), decode(null, 1, 'a', null, 'n'), decode(3, 1, 'a'), decode(3, 1, 'a', 'else'),"
          " decode('1', 1, 'same')", "b,n,null,else,same;"},
         {"decode('x', 1, 'a')", "error 1722"}, {"decode(1, null, 'n', 'else'), decode(null, 1, 2, 'else')", "else,else;"},
