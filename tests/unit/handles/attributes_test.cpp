@@ -187,26 +187,16 @@ TEST_F(AttributesTest, EveryNumberOverEveryKind) {
 TEST_F(AttributesTest, ValuesThatAreRefused) {
     const std::map<char, Handle> handles = OneOfEach();
     static ub4 integer = 0;
-    static const char* const text = "a group of more than 30 letters; and behind them more, up to 64 of them, and the rest";
-    const struct { char kind; ub4 attribute; ub4 integer; const char* text; ub4 size; sb4 answer; } cases[] = {
-        {'b', OCI_ATTR_PDSCL, 127, nullptr, 0, 0},           {'b', OCI_ATTR_PDSCL, 128, nullptr, 0, 24328},
-        {'d', OCI_ATTR_PDSCL, 0xFFAC, nullptr, 0, 0},        {'d', OCI_ATTR_PDSCL, 0xFFAB, nullptr, 0, 24328},
-        {'b', OCI_ATTR_PDPRC, 40, nullptr, 0, 0},            {'b', OCI_ATTR_PDPRC, 41, nullptr, 0, 24328},
-        {'b', OCI_ATTR_CHARSET_FORM, 2, nullptr, 0, 0},      {'b', OCI_ATTR_CHARSET_FORM, 3, nullptr, 0, 24328},
-        {'d', OCI_ATTR_CHARSET_FORM, 0, nullptr, 0, 24328},  {'d', OCI_ATTR_CHARSET_ID, 870, nullptr, 0, 24329},
-        {'t', OCI_ATTR_XID, 0, text, 139, 24750},            {'v', OCI_ATTR_SERVER_GROUP, 0, text, 31, 24328},
-        {'v', OCI_ATTR_SERVER_GROUP, 0, text, 30, 0},        {'u', OCI_ATTR_MIGSESSION, 0, text, 0, 24328},
-        {'u', OCI_ATTR_PROXY_CREDENTIALS, 0, text, 0, 24328}, {'t', OCI_ATTR_TRANS_NAME, 0, text, 64, 0},
-        {'t', OCI_ATTR_TRANS_NAME, 0, text, 65, 24328}};
+    const struct { char kind; ub4 attribute; ub4 integer; sb4 answer; } cases[] = {
+        {'b', OCI_ATTR_PDSCL, 127, 0}, {'b', OCI_ATTR_PDSCL, 128, 24328}, {'d', OCI_ATTR_PDSCL, 0xFFAC, 0},
+        {'d', OCI_ATTR_PDSCL, 0xFFAB, 24328}, {'b', OCI_ATTR_PDPRC, 40, 0}, {'b', OCI_ATTR_PDPRC, 41, 24328},
+        {'b', OCI_ATTR_CHARSET_FORM, 2, 0}, {'b', OCI_ATTR_CHARSET_FORM, 3, 24328},
+        {'d', OCI_ATTR_CHARSET_FORM, 0, 24328}, {'d', OCI_ATTR_CHARSET_ID, 870, 24329}};
     for (const auto& c : cases) {
         const Handle& on = handles.at(c.kind);
         integer = c.integer;
-        dvoid* const value = c.text ? const_cast<char*>(c.text) : static_cast<dvoid*>(&integer);
-        EXPECT_EQ(Set(on.pointer, on.type, c.attribute, value, c.size), c.answer) << c.attribute << " " << c.integer;
+        EXPECT_EQ(Set(on.pointer, on.type, c.attribute, &integer), c.answer) << c.attribute << " " << c.integer;
     }
-    EXPECT_EQ(Set(handles.at('u').pointer, OCI_HTYPE_SESSION, OCI_ATTR_USERNAME, nullptr, 1), 24328);
-    auto* attached = Attribute<OCIServer*>(handles.at('c').pointer, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
-    EXPECT_EQ(Set(attached, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_GROUP, const_cast<char*>("g"), 1), 24339);
 }
 
 // Of dates and times numbers 16 and 17 mean something else, in one byte.
@@ -268,30 +258,6 @@ TEST_F(AttributesTest, MemoryAndFailover) {
     EXPECT_GE(heap(), before + 10000);
     EXPECT_EQ(OCIHandleFree(handle, OCI_HTYPE_STMT), OCI_SUCCESS);
     EXPECT_EQ(heap(), before);
-}
-
-TEST_F(AttributesTest, LastCall) {
-    const auto last = [&] { return Attribute<ub4>(err_, OCI_HTYPE_ERROR, OCI_ATTR_FNCODE); };
-    auto* other = New<OCIError>(OCI_HTYPE_ERROR);
-    EXPECT_EQ(Attribute<ub4>(env_, OCI_HTYPE_ENV, OCI_ATTR_FNCODE), 2u) << "a handle was allocated";
-    EXPECT_EQ(Attribute<ub4>(other, OCI_HTYPE_ERROR, OCI_ATTR_FNCODE), 0u) << "no call yet";
-    EXPECT_EQ(last(), 54u);
-    EXPECT_EQ(Run("select a from t", 0), 0);
-    EXPECT_EQ(last(), 21u);
-    OCIStmtFetch(stmt_, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT);
-    EXPECT_EQ(last(), 28u);
-    EXPECT_EQ(last(), 28u) << "asking does not count";
-    OCIStmtSetPieceInfo(New<OCIBind>(OCI_HTYPE_BIND), OCI_HTYPE_BIND, err_, nullptr, nullptr, 0, nullptr, nullptr);
-    EXPECT_EQ(last(), 61u);
-    OCIBreak(svc_, err_);
-    EXPECT_EQ(last(), 50u);
-    OCIPing(svc_, err_, OCI_DEFAULT);
-    EXPECT_EQ(last(), 0u) << "has no number";
-    OCISvcCtx* svc = nullptr;
-    EXPECT_EQ(LogOn(&svc, ":memory:"), 0);
-    EXPECT_EQ(last(), 76u);
-    OCILogoff(svc, err_);
-    EXPECT_EQ(last(), 77u);
 }
 
 TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {

@@ -75,68 +75,6 @@ protected:
     boolean found_ = FALSE;
 };
 
-TEST_F(Pools, NumbersOfAPool) {
-    EXPECT_EQ(Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_MAX), 0u) << "of no pool";
-    const struct { ub4 least, most, step; sb4 answer; } cases[] = {
-        {0, 0, 0, 24413}, {2, 1, 1, 24413}, {0, 2, 0, 24413}, {1, 0, 1, 24413}, {2, 2, 0, 0}, {0, 1, 5, 0},
-        {~0U, ~0U, 1, 24413}, {0, ~0U, ~0U, 24413}, {0, ~0U, 1, 0}, {0, 1, ~0U, 0}};
-    for (const auto& c : cases) {
-        EXPECT_EQ(Create(c.least, c.most, c.step), c.answer) << c.least << ' ' << c.most << ' ' << c.step;
-        if (c.answer != 0) continue;
-        EXPECT_EQ(OpenCount(), c.least);
-        EXPECT_EQ(Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_MAX), c.most);
-        EXPECT_EQ(Destroy(), 0);
-    }
-    EXPECT_EQ(Create(0, 1, 1, 0x10), 24393);
-    EXPECT_EQ(Create(1, 1, 1, kHomogeneous, "", "secret"), 24415);
-    EXPECT_EQ(Create(1, 1, 1, kHomogeneous, nullptr, "wrong"), 1017);
-    EXPECT_EQ(Destroy(), 24404);
-    MUST(Create(3, 3, 0, kHomogeneous | OCI_SPC_NO_RLB), Create(1, 2, 1, OCI_SPC_REINITIALIZE));
-    EXPECT_EQ(OpenCount(), 2u) << "what rests beyond the most is closed at once";
-    EXPECT_EQ(Destroy(), 0);
-    // Steps, a surplus that goes as it comes back, and a pool that shrinks and grows.
-    ASSERT_EQ(Create(1, 4, 2), 0);
-    OCISvcCtx* svc[4] = {};
-    const ub4 open[] = {1, 3, 3, 4};
-    for (int index = 0; index < 4; ++index) {
-        ASSERT_EQ(Get(&svc[index], err_), 0);
-        EXPECT_EQ(OpenCount(), open[index]) << index;
-    }
-    SHOULD(Create(1, 2, 1, OCI_SPC_REINITIALIZE), Release(svc[0]), Release(svc[1]));
-    EXPECT_EQ(OpenCount(), 2u);
-    EXPECT_EQ(Create(3, 3, 0, OCI_SPC_REINITIALIZE), 0);
-    EXPECT_EQ(OpenCount(), 3u);
-    EXPECT_EQ(Destroy(2), 24394);
-    EXPECT_EQ(Destroy(), 24422);
-    EXPECT_EQ(OCIHandleFree(pool_, OCI_HTYPE_SPOOL), OCI_ERROR);
-    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 24386);
-    SHOULD(Release(svc[2]), OCIHandleFree(svc[3], OCI_HTYPE_SVCCTX));
-    EXPECT_EQ(OpenCount(), 2u) << "the freed context's is closed";
-    EXPECT_EQ(OCIHandleFree(pool_, OCI_HTYPE_SPOOL), OCI_SUCCESS) << "destroys what is not in use";
-}
-
-TEST_F(Pools, ModesThatAreRefused) {
-    ASSERT_EQ(Create(0, 1, 1), 0);
-    const struct { ub4 mode; sb4 answer; } cases[] = {
-        {kSpool | OCI_SESSGET_CPOOL, 24300}, {OCI_SESSGET_SPOOL_MATCHANY, 24300}, {0x1000, 24300},
-        {kSpool | OCI_SESSGET_PURITY_NEW | OCI_SESSGET_PURITY_SELF, 24300}, {kSpool | OCI_SESSGET_CREDPROXY, 24419},
-        {kSpool | OCI_SESSGET_SYSDBA, 24300}, {OCI_SESSGET_SYSDBA, 1031}, {OCI_SESSGET_CPOOL, 24392},
-        {kSpool | OCI_SESSGET_CREDEXT, 24300}};
-    OCISvcCtx* svc = nullptr;
-    for (const auto& c : cases) EXPECT_EQ(Get(&svc, err_, c.mode), c.answer) << c.mode;
-    EXPECT_EQ(svc, nullptr);
-    EXPECT_EQ(Get(nullptr, err_), 21560);
-    EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, Bogus<OCIAuthInfo>()), OCI_INVALID_HANDLE);
-    ASSERT_EQ(Get(&svc, err_), 0);
-    EXPECT_EQ(Release(svc, 4), 24300);
-    OCISession* session = Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
-    OCIServer* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
-    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, session, 0)), 24420);
-    EXPECT_EQ(Answer(OCIServerDetach(server, err_, 0)), 24420);
-    EXPECT_EQ(LogOn(&svc, "work"), 24420) << "a logon would log it off first";
-    EXPECT_EQ(Release(svc), 0);
-}
-
 TEST_F(Pools, WhichSessionComes) {
     ASSERT_EQ(Create(0, 3, 1), 0);
     const auto come_and_go = [&](const char* tag, ub4 mode, const char* retag) {
@@ -264,7 +202,9 @@ TEST_F(Pools, WhatASessionLeaves) {
         ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text(name_), static_cast<ub4>(name_.size()),
                                    OCI_LOGON2_SPOOL)), 0);
         EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), cache) << "only where it is wanted";
-        if (cache == 0) EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+        if (cache == 0) {
+            EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+        }
     }
     ASSERT_EQ(prepare(&stmt), 0);    // kept to the environment's end
     ASSERT_EQ(Answer(OCIStmtExecute(svc, stmt, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);

@@ -108,12 +108,8 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     EXPECT_EQ(opinit(0), 0);
 }
 
-TEST_F(LegacyCalls, AreasTellOfTheirCall) {
-    EXPECT_EQ(onbtst(&lda), 3128);
-    EXPECT_EQ(lda.v2_rc, -3128);
-    Fill(2);
-    EXPECT_EQ(Run("delete from t"), 0);
-    EXPECT_EQ(std::make_tuple(cda.rpc, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(2u, 0u, 0));
+// Arguments and answers that scripts neither give nor see.
+TEST_F(LegacyCalls, BesideTheTranscripts) {
     if (!server) {
         EXPECT_EQ(Run("insert into t (rowid, n) values (1 * 65536 * 65536 * 65536 + 131075, 1)"), 0);
         EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(1, 2u, 3));
@@ -122,143 +118,24 @@ TEST_F(LegacyCalls, AreasTellOfTheirCall) {
     EXPECT_EQ(odessp(&lda, T("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
                      nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &count), 4043);
     EXPECT_EQ(count, 0u);
-}
-
-TEST_F(LegacyCalls, TextsAreParsedAtOnceOrLater) {
-    EXPECT_EQ(oparse(&cda, T("select 1 from dual"), 0x7FFFFFFF, 0, 2), 0) << "its zero ends it";
-    EXPECT_EQ(Parse("select n, x from t", 0), 904);
-    EXPECT_EQ(std::make_tuple(cda.peo, cda.v2_rc), std::make_tuple(10, -904));
-    EXPECT_EQ(oexec(&cda), 1003);
-    EXPECT_EQ(Parse("select x from t"), 0);
-    EXPECT_EQ(std::make_tuple(cda.ft, cda.peo), std::make_tuple(4, 0)) << "of this text";
-    EXPECT_EQ(oexec(&cda), 904);
-    EXPECT_EQ(cda.fc, 4);
-    EXPECT_EQ(Parse("drop table t", 0), 0);    // runs, and the execute does not again
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(oexec(&cda), 942);
-}
-
-TEST_F(LegacyCalls, ColumnsAreDescribedUntilThereIsNone) {
-    const sb4 bytes = server ? 40 : 10;    // the server counts characters
-    sb4 size = 0, display = 0, length = 1;
-    sb2 type = 0, nulls = 0;
-    std::array<sb1, 4> name{'#', '#', '#', '#'};
-    ASSERT_EQ(Parse("select n, c as ce from t"), 0);
-    EXPECT_EQ(odescr(&cda, 2, &size, &type, name.data(), &length, &display, nullptr, nullptr, &nulls), 0);
-    EXPECT_EQ(std::make_tuple(size, type, length, name[0], name[1], display, nulls),
-              std::make_tuple(bytes, 1, 1, 'C', '#', bytes, 1));
-    EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);    // at once, since it is compiled
-    SHOULD(Define(1, &number, 4, SQLT_INT), oexec(&cda), ocan(&cda));
-    EXPECT_EQ(Define(3, &number, 4, SQLT_INT), 1007);
-    EXPECT_EQ(odescr(&cda, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
-    sb2 scale = 0;
-    SHOULD(Parse("select cast(n as number) from t"),
-           odescr(&cda, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &scale, nullptr));
-    EXPECT_EQ(scale, -127);
-    ASSERT_EQ(Parse("select n from t"), 0);
-    EXPECT_EQ(Define(2, &number, 4, SQLT_INT), 0);       // nobody knows yet
-    EXPECT_EQ(oexec(&cda), 1007);
-}
-
-TEST_F(LegacyCalls, FetchesCountAndEnd) {
-    Fill(5);
-    ASSERT_EQ(Parse("select n, c from t order by n"), 0);
-    EXPECT_EQ(ofetch(&cda), 1002);
-    EXPECT_EQ(oexec(&cda), 0);
-    std::array<int, 3> numbers{};
-    SHOULD(Define(1, numbers.data(), 4, SQLT_INT), ofetch(&cda), ofen(&cda, 3));
-    EXPECT_EQ(cda.rpc, 4u);
-    EXPECT_EQ(numbers, (std::array{2, 3, 4}));
-    EXPECT_EQ(ofen(&cda, 3), 1403);
-    EXPECT_EQ(cda.v2_rc, 4);
-    EXPECT_EQ(cda.rpc, 5u);
-    SHOULD(oexec(&cda), ocan(&cda));
-    EXPECT_EQ(ofetch(&cda), 1002);
-    EXPECT_EQ(oexfet(&cda, 3, 0, 1), 1422);
-    EXPECT_EQ(cda.rpc, 3u) << "as many as were asked for";
-    EXPECT_EQ(ofetch(&cda), 1002);
-    SHOULD(oexfet(&cda, 3, 0, 0), ofetch(&cda));
-    EXPECT_EQ(numbers, (std::array{4, 2, 3})) << "the fourth, behind the first three";
-}
-
-TEST_F(LegacyCalls, RowsThatCannotBeStoredArePassedOver) {
-    ASSERT_EQ(Parse("select 'abcdef', 1 from dual union all select null, 2 from dual union all select 'x', 3 from dual"), 0);
-    sb2 indicator = 0;
-    ub2 code = 0;
-    SHOULD(Define(1, characters.data(), 3, SQLT_STR), oexec(&cda));
-    for (const sword result : {1406, 1405, 0, 1403}) EXPECT_EQ(ofetch(&cda), result);
-    EXPECT_EQ(cda.rpc, 1u);
-    SHOULD(Define(1, characters.data(), 3, SQLT_STR, &indicator, &code), oexec(&cda), ofetch(&cda));
-    EXPECT_EQ(std::make_tuple(cda.wrn, code, indicator), std::make_tuple(3, 1406, 6));
-    EXPECT_EQ(ofetch(&cda), 0);
-    EXPECT_EQ(std::make_tuple(cda.wrn, code, indicator), std::make_tuple(0, 1405, -1));
-}
-
-TEST_F(LegacyCalls, PackedDecimalsHaveAScale) {
+    ASSERT_EQ(Parse("select -987.65, 'abcdef' from dual where :v is null"), 0);
+    for (const sword type : {65536 + SQLT_CHR, -1}) EXPECT_EQ(Bind("v", characters.data(), 8, type), 1024) << type;
+    EXPECT_EQ(obindps(&cda, 1, T("v"), -1, nullptr, 10, SQLT_CHR, -1, nullptr, nullptr, nullptr, 0, 0, 0, -1, 0, nullptr,
+                      nullptr, -1, -1), 1025);
+    sb2 null = -1;
+    EXPECT_EQ(obndrv(&cda, T("v"), -1, nullptr, 1, SQLT_CHR, -1, &null, nullptr, -1, -1), 0);
     std::array<ub1, 3> packed{};
-    ASSERT_EQ(Parse("select :v from dual"), 0);
-    ASSERT_EQ(obndrv(&cda, T("v"), -1, packed.data(), 3, SQLT_PDN, 2, nullptr, nullptr, -1, -1), 0);
-    for (const auto& [scale, digits] : {std::pair{2, 0x98765D}, {1, 0x09877D}, {0, 0x00988D}, {-1, 0x00988D}}) {
-        packed = {0x98, 0x76, 0x5D};    // -987.65
-        EXPECT_EQ(odefin(&cda, 1, packed.data(), 3, SQLT_PDN, scale, nullptr, nullptr, -1, -1, nullptr, nullptr), 0);
-        EXPECT_EQ(oexfet(&cda, 1, 0, 0), 0);
-        EXPECT_EQ(packed[0] << 16 | packed[1] << 8 | packed[2], digits) << scale;
-    }
-}
-
-TEST_F(LegacyCalls, BindsAreByNameOrNumberAndOfPlainTypes) {
-    ASSERT_EQ(Parse("insert into t values (:1, :text)"), 0);
-    for (const sword type : {SQLT_CLOB, SQLT_CUR, SQLT_RDD, SQLT_VST, 91, 65536 + SQLT_CHR, -1}) {
-        EXPECT_EQ(Bind(":text", characters.data(), 8, type), 1024) << type;
-    }
-    for (const sword type : {SQLT_INT, SQLT_FLT, SQLT_CHR, SQLT_BFLOAT}) {
-        EXPECT_EQ(Bind(":text", characters.data(), -1, type), 1025) << type;
-    }
-    for (const sword type : {SQLT_STR, SQLT_NUM, SQLT_VNU, SQLT_DAT, SQLT_ODT}) {
-        EXPECT_EQ(Bind(":text", host.data(), -1, type), 0) << type;
-    }
-    EXPECT_EQ(Bind(":text", nullptr, -1, SQLT_STR), 1025);
-}
-
-TEST_F(LegacyCalls, ValuesGoInPieces) {
-    int context = 0;
-    ub1 piece = 0;
-    dvoid* told = nullptr;
-    ub4 iteration = 9, index = 9, length = 3;
-    ASSERT_EQ(Parse("insert into t values (1, :c)"), 0);
-    const auto bind = [&](ub1 opcode, sb4 skip = 0) {
-        return obindps(&cda, opcode, T(":c"), -1, reinterpret_cast<ub1*>(&context), 10, SQLT_CHR, -1, nullptr, nullptr,
-                       nullptr, 0, 0, 0, skip, 0, nullptr, nullptr, -1, -1);
-    };
-    EXPECT_EQ(bind(1, -1), 1025);
-    ASSERT_EQ(bind(0), 0);
-    EXPECT_EQ(oexec(&cda), 3129);
-    EXPECT_EQ(ofetch(&cda), 3127);
-    EXPECT_EQ(ogetpi(&cda, &piece, &told, &iteration, &index), 0);
-    EXPECT_EQ(std::make_tuple(told, iteration, index), std::make_tuple(static_cast<dvoid*>(&context), 0u, 0u));
-    EXPECT_EQ(osetpi(&cda, OCI_FIRST_PIECE, T("abc"), &length), 0);
-    EXPECT_EQ(oexec(&cda), 3129);
-    SHOULD(osetpi(&cda, OCI_LAST_PIECE, T("def"), &length), oexec(&cda));
-    EXPECT_EQ(cda.rpc, 1u);
-
-    ASSERT_EQ(Parse("select c from t"), 0);
-    ASSERT_EQ(odefinps(&cda, 0, 1, reinterpret_cast<ub1*>(&context), 10, SQLT_CHR, -1, nullptr, nullptr, -1, -1, nullptr,
-                       nullptr, 0, 0, 0, 0), 0);
-    ASSERT_EQ(oexec(&cda), 0);
-    std::string whole;
-    sword result = ofetch(&cda);
-    for (int pieces = 0; result == 3130 && pieces < 3; ++pieces) {
-        length = 4;
-        SHOULD(ogetpi(&cda, &piece, &told, &iteration, &index), osetpi(&cda, piece, characters.data(), &length));
-        result = ofetch(&cda);
-        whole.append(characters.data(), length);
-    }
-    EXPECT_EQ(result, 0);
-    EXPECT_EQ(whole, "abcdef");
-    ASSERT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(ofetch(&cda), 3130);
-    EXPECT_EQ(ocan(&cda), 0);
-    EXPECT_EQ(ogetpi(&cda, &piece, &told, nullptr, nullptr), 24370);
+    EXPECT_EQ(odefin(&cda, 1, packed.data(), 3, SQLT_PDN, -1, nullptr, nullptr, -1, -1, nullptr, nullptr), 0);
+    EXPECT_EQ(oexfet(&cda, 1, 0, 0), 0);
+    EXPECT_EQ(packed, (std::array<ub1, 3>{0x00, 0x98, 0x8D})) << "without a scale";
+    characters.fill('#');
+    EXPECT_EQ(oflng(&cda, 2, reinterpret_cast<ub1*>(characters.data()), 4, SQLT_CHR, nullptr, 4), 0);
+    EXPECT_EQ(std::string_view(characters.data(), 3), "ef#");
+    EXPECT_EQ(oflng(&cda, 2, nullptr, 1, SQLT_CHR, nullptr, 0), 1009);
+    sb4 length = 2;
+    EXPECT_EQ(odescr(&cda, 2, nullptr, nullptr, reinterpret_cast<sb1*>(characters.data()), &length, nullptr, nullptr,
+                     nullptr, nullptr), 0);
+    EXPECT_EQ(characters[2], '#') << "not terminated";
 }
 
 TEST_F(LegacyCalls, TextsOfNumbers) {
@@ -277,89 +154,6 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
     EXPECT_EQ(oerhms(&lda, 904, message.data(), 5), 0);
     EXPECT_STREQ(words, "[KEL");
     EXPECT_EQ(oerhms(nullptr, 942, message.data(), 0), 1009);
-}
-
-TEST_F(LegacyCalls, PartsOfLongValues) {
-    ASSERT_EQ(Run("create table l (n integer, c long, r raw(10))"), 0);
-    ASSERT_EQ(Run("insert into l values (1, 'abcdefghij', hextoraw('00FF41'))"), 0);
-    MUST(Run("insert into l values (2, null, null)"), Parse("select n, c, r from l order by n"));
-    ub4 length = 9;
-    std::string part(4, '#');
-    const auto read = [&](sword position, sb4 offset, sb4 room = 4, sword type = 8) {
-        part.assign(4, '#');
-        return oflng(&cda, position, reinterpret_cast<ub1*>(part.data()), room, type, &length, offset);
-    };
-    EXPECT_EQ(read(2, 0), 1002);
-    std::array<int, 2> numbers{};
-    MUST(Define(1, numbers.data(), 4, SQLT_INT), oexec(&cda));
-    EXPECT_EQ(read(2, 0), 1002);
-    ASSERT_EQ(ofetch(&cda), 0);
-    const struct { sword position; sb4 offset; std::string_view expected; } kParts[] = {
-        {2, 0, "abcd"}, {2, 8, "ij##"}, {2, 10, "####"}, {2, 70000, "####"}, {3, 0, {"\0\xFF" "A#", 4}}, {3, 1, "\xFF" "A##"}};
-    for (const auto& [position, offset, expected] : kParts) {
-        EXPECT_EQ(read(position, offset), 0);
-        EXPECT_EQ(part, expected);
-        EXPECT_EQ(length, std::min<std::size_t>(4, expected.find('#')));
-    }
-    EXPECT_EQ(oflng(&cda, 2, nullptr, 0, 8, nullptr, 0), 0);
-    const struct { sword position; sb4 offset, room; sword type, result; } kRefused[] = {
-        {0, 0, 4, 8, 1007}, {4, 0, 4, 8, 1007}, {2, -1, 4, 8, 1025}, {2, 0, -1, 8, 1025}, {2, 0, 4, 112, 1024}};
-    for (const auto& c : kRefused) EXPECT_EQ(read(c.position, c.offset, c.room, c.type), c.result) << c.position;
-    EXPECT_EQ(cda.fc, 58);
-    EXPECT_EQ(ofetch(&cda), 0);
-    EXPECT_EQ(read(2, 0), 1405);
-    EXPECT_EQ(ofetch(&cda), 1403);
-    EXPECT_EQ(read(2, 0), 1002);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(ofen(&cda, 2), 0);    // of several the last
-    EXPECT_EQ(read(3, 0), 1405);
-    EXPECT_EQ(oexec(&cda), 0);
-    EXPECT_EQ(read(3, 0), 1002) << "of the former result";
-    SHOULD(ofetch(&cda), ocan(&cda));
-    EXPECT_EQ(read(3, 0), 1002);
-}
-
-TEST_F(LegacyCalls, ExecutesThatFailUndoARowOrAll) {
-    MUST(Run("create unique index u on t (n)"), Run("insert into t values (9, null)"));
-    std::array<int, 5> numbers{7, 1, 2, 1, 3};    // of which the first is passed over
-    const auto insert = [&](sword rollback) {
-        SHOULD(Parse("insert into t values (:n, null)"), oopt(&cda, rollback, 0));
-        EXPECT_EQ(Bind("n", numbers.data(), 4, SQLT_INT), 0);
-        return oexn(&cda, 5, 1);
-    };
-    EXPECT_EQ(insert(0), 1);
-    EXPECT_EQ(cda.rpc, 0u);
-    EXPECT_EQ(One("select count(*) from t"), 1);
-    EXPECT_EQ(insert(2), 1);
-    EXPECT_EQ(cda.rpc, 2u);
-    EXPECT_EQ(One("select count(*) from t"), 3);
-    EXPECT_EQ(orol(&lda), 0);
-    EXPECT_EQ(insert(0), 1);    // the first of its transaction
-    EXPECT_EQ(orol(&lda), 0);
-    numbers[3] = 4;
-    SHOULD(ocon(&lda), insert(0));
-    EXPECT_EQ(cda.rpc, 4u);
-    SHOULD(ocof(&lda), orol(&lda));
-    EXPECT_EQ(One("select count(*) from t"), 4);
-
-    // Values in pieces: the first row is done when the last one fails; nothing else runs in between.
-    ASSERT_EQ(Parse("insert into t values (5, :c)"), 0);
-    ASSERT_EQ(obindps(&cda, 0, T("c"), -1, reinterpret_cast<ub1*>(&number), 10, SQLT_CHR, -1, nullptr, nullptr, nullptr,
-                      0, 0, 0, 0, 0, nullptr, nullptr, -1, -1), 0);
-    Cda_Def other{};
-    ASSERT_EQ(oopen(&other, &lda, nullptr, -1, -1, nullptr, -1), 0);
-    ub4 length = 3;
-    for (const bool given_up : {false, true}) {
-        EXPECT_EQ(oexn(&cda, 2, 0), 3129);
-        EXPECT_EQ(osetpi(&cda, OCI_ONE_PIECE, T("abc"), &length), 0);
-        EXPECT_EQ(oexn(&cda, 2, 0), 3129);
-        EXPECT_EQ(ocom(&lda), 3127);
-        EXPECT_EQ(oparse(&other, T("delete from t"), -1, 1, 2), 3127);
-        EXPECT_EQ(osetpi(&cda, OCI_ONE_PIECE, T("abc"), &length), 0);
-        EXPECT_EQ(given_up ? ocan(&cda) : oexn(&cda, 2, 0), given_up ? 0 : 1);
-        EXPECT_EQ(ocom(&lda), 0);
-    }
-    EXPECT_EQ(One("select count(*) from t"), 4);
 }
 
 TEST_F(LegacyCalls, LocksAreWaitedForOrNot) {
@@ -400,125 +194,35 @@ TEST_F(LegacyCalls, LocksAreWaitedForOrNot) {
     for (const char* ending : {"", "-wal", "-shm", "-journal"}) std::filesystem::remove(file.string() + ending);
 }
 
-// A session with handles: a context that lends it, or takes it over.
-class LegacyBridges : public LegacyCalls {
-protected:
-    void SetUp() override {
-        LegacyCalls::SetUp();
-        ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), 0);
-        err = static_cast<OCIError*>(New(OCI_HTYPE_ERROR));
-        stmt = static_cast<OCIStmt*>(New(OCI_HTYPE_STMT));
-    }
-    void TearDown() override {
-        EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
-        LegacyCalls::TearDown();
-    }
-    dvoid* New(ub4 type) {
+// A context that goes while its session is lent waits for what is left unfinished.
+TEST_F(LegacyCalls, AContextThatLendsItsSessionGoes) {
+    OCIEnv* env = nullptr;
+    ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr), 0);
+    const auto make = [env](ub4 type) {
         dvoid* handle = nullptr;
         EXPECT_EQ(OCIHandleAlloc(env, &handle, type, 0, nullptr), 0);
         return handle;
-    }
-    // The number of what a call on the handles answered.
-    sword Number(sword code) {
-        sb4 number = 0;
-        if (code == OCI_SUCCESS || code == OCI_INVALID_HANDLE) return code;
-        OCIErrorGet(err, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
-        return number;
-    }
-    sword ExecuteOn(OCISvcCtx* service, std::string_view sql) {
-        EXPECT_EQ(OCIStmtPrepare(stmt, err, T(sql.data()), static_cast<ub4>(sql.size()), OCI_NTV_SYNTAX, 0), 0);
-        return Number(OCIStmtExecute(service, stmt, err, 1, 0, nullptr, nullptr, 0));
-    }
-    int CountOn(OCISvcCtx* service) {
-        int count = -1;
-        OCIDefine* define = nullptr;
-        EXPECT_EQ(OCIStmtPrepare(stmt, err, T("select count(*) from t"), 22, OCI_NTV_SYNTAX, 0), 0);
-        EXPECT_EQ(OCIDefineByPos(stmt, &define, err, 1, &count, 4, SQLT_INT, nullptr, nullptr, nullptr, 0), 0);
-        EXPECT_EQ(Number(OCIStmtExecute(service, stmt, err, 1, 0, nullptr, nullptr, 0)), 0);
-        return count;
-    }
-
-    OCIEnv* env = nullptr;
-    OCIError* err = nullptr;
-    OCIStmt* stmt = nullptr;
-    OCISvcCtx* none = nullptr;
-};
-
-TEST_F(LegacyBridges, ALoginBecomesAContext) {
-    Fill(3);
-    ASSERT_EQ(onbset(&lda), 0);
-    EXPECT_EQ(OCILdaToSvcCtx(&none, err, &cda), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Number(OCILdaToSvcCtx(nullptr, err, &lda)), 21560);
-    EXPECT_EQ(lda.rc, 21560);
-    OCISvcCtx* taken = nullptr;
-    ASSERT_EQ(OCILdaToSvcCtx(&taken, err, &lda), OCI_SUCCESS);
-    EXPECT_EQ(lda.rc, 0);
-    EXPECT_EQ(ocom(&lda), 1001);
-    EXPECT_EQ(CountOn(taken), 3);
-    ub1 mode = 0;
-    EXPECT_EQ(OCIAttrGet(taken, OCI_HTYPE_SVCCTX, &mode, nullptr, OCI_ATTR_NONBLOCKING_MODE, err), 0);
-    EXPECT_EQ(mode, 1);
-    EXPECT_EQ(OCITransRollback(taken, err, 0), 0);
-    EXPECT_EQ(CountOn(taken), 0);
-
-    // Another's session moves into the living context, which ends the one that it had.
-    ASSERT_EQ(LogOn(lda), 0);
-    OCISvcCtx* const same = taken;
-    EXPECT_EQ(OCILdaToSvcCtx(&taken, err, &lda), OCI_SUCCESS);
-    EXPECT_EQ(taken, same);
-    MUST(ExecuteOn(taken, "create table made (n integer)"), OCILogoff(taken, err), LogOn(lda));
-}
-
-TEST_F(LegacyBridges, AContextLendsItsSession) {
+    };
+    auto* const err = static_cast<OCIError*>(make(OCI_HTYPE_ERROR));
     OCISvcCtx* service = nullptr;
     Lda_Def lent{};
-    const auto name = [&](OCISvcCtx** out) {
-        const std::size_t slash = user.find('/');
-        return OCILogon(env, err, out, T(user.c_str()), static_cast<ub4>(server ? slash : 0), T("secret"), server ? 6 : 0,
-                        T(database.c_str()), static_cast<ub4>(database.size()));
-    };
-    auto* const idle = static_cast<OCISvcCtx*>(New(OCI_HTYPE_SVCCTX));
-    EXPECT_EQ(Number(OCISvcCtxToLda(idle, err, &unknown)), 3114);
-    EXPECT_EQ(unknown.rc, 3114);
-    ASSERT_EQ(name(&service), 0);
-    if (!server) {
-        ASSERT_EQ(ExecuteOn(service, "create table t (n integer, c varchar2(10))"), 0);
-    }
-    EXPECT_EQ(Number(OCISvcCtxToLda(service, err, &lda)), 1015);
-    MUST(ExecuteOn(service, "insert into t values (1, null)"), OCISvcCtxToLda(service, err, &lent));
-    OCISession* session = nullptr;
-    EXPECT_EQ(OCIAttrGet(service, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err), 0);
-    EXPECT_EQ(Number(OCISessionEnd(service, err, static_cast<OCISession*>(New(OCI_HTYPE_SESSION)), 0)), 1012);
-    for (const sword number : {Number(OCISvcCtxToLda(service, err, &unknown)), ExecuteOn(service, "delete from t"),
-                               Number(OCITransCommit(service, err, 0)), Number(OCITransRollback(service, err, 0)),
-                               Number(OCIPing(service, err, 0)), Number(OCIBreak(service, err)),
-                               Number(OCILogoff(service, err)), Number(name(&service)),
-                               Number(OCISessionEnd(service, err, session, 0)),
-                               Number(OCIPasswordChange(service, err, T("u"), 1, T("o"), 1, T("n"), 1, OCI_AUTH))}) {
-        EXPECT_EQ(number, 24406);
-    }
-    ub1 current = 9;
-    EXPECT_EQ(OCIAttrGet(service, OCI_HTYPE_SVCCTX, &current, nullptr, OCI_ATTR_IN_V8_MODE, err), 0);
-    EXPECT_EQ(current, 0);
     Cda_Def cursor{};
-    ASSERT_EQ(oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1), 0);
-    MUST(oparse(&cursor, T("insert into t values (2, null)"), -1, 1, 2), oexec(&cursor));
-    OCISvcCtx* back = nullptr;
-    EXPECT_EQ(OCILdaToSvcCtx(&back, err, &lent), 0);
-    EXPECT_EQ(back, service);
-    EXPECT_EQ(oexec(&cursor), 1001);
-    EXPECT_EQ(CountOn(service), 2);
-    EXPECT_EQ(OCITransRollback(service, err, 0), 0);
-    EXPECT_EQ(CountOn(service), 0);
-    // The end of the context is the end of the login.
+    EXPECT_EQ(OCISvcCtxToLda(static_cast<OCISvcCtx*>(make(OCI_HTYPE_SVCCTX)), err, &unknown), OCI_ERROR);
+    EXPECT_EQ(unknown.rc, 3114);
+    const std::size_t slash = user.find('/');
+    ASSERT_EQ(OCILogon(env, err, &service, T(user.c_str()), static_cast<ub4>(server ? slash : 0), T("secret"),
+                       server ? 6 : 0, T(database.c_str()), static_cast<ub4>(database.size())), 0);
     MUST(OCISvcCtxToLda(service, err, &lent), oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1));
-    if (server) {    // which waits for what is left unfinished
+    if (server) {
         MUST(oparse(&cursor, T("select pg_sleep(0.5)"), -1, 1, 2), onbset(&lent));
         EXPECT_EQ(oexec(&cursor), 3123);
-        EXPECT_EQ(Number(OCILdaToSvcCtx(&back, err, &lent)), 3127);
+        OCISvcCtx* back = nullptr;
+        EXPECT_EQ(OCILdaToSvcCtx(&back, err, &lent), OCI_ERROR);
+        EXPECT_EQ(lent.rc, 3127);
     }
     EXPECT_EQ(OCIHandleFree(service, OCI_HTYPE_SVCCTX), 0);
     EXPECT_EQ(oexec(&cursor), 1001);
+    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
 }
 
 // What an engine can leave unfinished is repeated until it is done; the embedded one ends every call.

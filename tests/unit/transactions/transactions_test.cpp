@@ -65,24 +65,6 @@ TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
     EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24756);
 }
 
-TEST_F(Transactions, OfAnotherUser) {
-    MUST(Start(0, 0, OCI_TRANS_NEW | OCI_TRANS_LOOSE), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
-    auto* branch = Attribute<OCITrans*>(svc_[1], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
-    ASSERT_EQ(Answer(OCILogoff(svc_[1], err_)), 0);
-    ASSERT_EQ(LogOn(&svc_[1], "bank", "ann", "secret"), 0) << "the owner from now on";
-    ASSERT_EQ(Answer(OCIAttrSet(svc_[1], OCI_HTYPE_SVCCTX, branch, 0, OCI_ATTR_TRANS, err_)), 0);
-    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24774);
-    XID xid{5, 2, 1, "txb"};
-    char info[] = "SqlNet=bank+Acc=P/ann/secret";
-    ASSERT_EQ(rmXaSwitch.xa_open_entry(info, 1, TMNOFLAGS), XA_OK);
-    EXPECT_EQ(rmXaSwitch.xa_start_entry(&xid, 1, TMJOIN), XAER_RMERR);
-    SQLCA diagnostics{};
-    EXPECT_EQ(XaGetInfo(1, &diagnostics), XA_OK);
-    EXPECT_EQ(diagnostics.sqlcode, -24774);
-    EXPECT_EQ(rmXaSwitch.xa_close_entry(nullptr, 1, TMNOFLAGS), XA_OK);
-    EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 0);
-}
-
 // A session that goes without a word takes its branch with it; a result does not outlive the connection.
 TEST_F(Transactions, SessionsThatGo) {
     MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
@@ -101,74 +83,6 @@ TEST_F(Transactions, SessionsThatGo) {
     EXPECT_EQ(Answer(OCITransDetach(svc_[1], err_, OCI_DEFAULT)), 0);
     EXPECT_EQ(Answer(OCIStmtFetch2(stmt_, err_, 1, OCI_FETCH_NEXT, 0, OCI_DEFAULT)), 1002);
     EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
-}
-
-TEST_F(Transactions, BranchesInMemoryStayWhereTheyAre) {
-    MUST(Answer(OCILogoff(svc_[0], err_)), LogOn(&svc_[0], ":memory:"), Run(0, "create table t(n number)"));
-    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
-    EXPECT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 24782);
-    EXPECT_EQ(Answer(OCITransPrepare(svc_[0], err_, OCI_DEFAULT)), 24782);
-    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_TRANS_TWOPHASE)), 24768);
-    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_DEFAULT)), 0);
-}
-
-// Each branch has its own answer; those of one global transaction alone are prepared together.
-TEST_F(Transactions, SeveralAreReadiedInOneCall) {
-    OCITrans* branches[2] = {};
-    OCIError* errors[2] = {err_, New<OCIError>(OCI_HTYPE_ERROR)};
-    for (int index : {0, 1}) branches[index] = Attribute<OCITrans*>(svc_[index], OCI_HTYPE_SVCCTX, OCI_ATTR_TRANS);
-    const auto name = [&](const char* data) {
-        XID xid{5, 2, 1, {}};
-        std::memcpy(xid.data, data, 3);
-        EXPECT_EQ(Answer(OCIAttrSet(branches[1], OCI_HTYPE_TRANS, &xid, sizeof xid, OCI_ATTR_XID, err_)), 0);
-    };
-    const auto prepare = [&] { return OCITransMultiPrepare(svc_[1], 2, branches, errors); };
-    name("txc");
-    MUST(Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), Run(0, "insert into t values(1)"));
-    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
-    EXPECT_EQ(prepare(), OCI_ERROR);
-    EXPECT_EQ(FirstCode(errors[0]), 25351) << "another session works in it";
-    EXPECT_EQ(FirstCode(errors[1]), 24767) << "the other one is ready all the same: it has changed nothing";
-    ASSERT_EQ(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), 0);
-    std::swap(branches[0], branches[1]);
-    EXPECT_EQ(prepare(), OCI_ERROR) << "whichever of them fails";
-    std::swap(branches[0], branches[1]);
-    MUST(Start(1, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
-    EXPECT_EQ(prepare(), OCI_SUCCESS_WITH_INFO) << "ready, and changed nothing";
-    MUST(Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)), Start(0, 60, OCI_TRANS_NEW | OCI_TRANS_LOOSE));
-    MUST(Run(0, "insert into t values(1)"), Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)));
-    name("tyc");
-    EXPECT_EQ(prepare(), OCI_ERROR);
-    EXPECT_EQ(FirstCode(errors[0]), 0);
-    EXPECT_EQ(FirstCode(errors[1]), 24781);
-    EXPECT_EQ(OCITransMultiPrepare(svc_[1], 1, branches, errors), OCI_ERROR);
-    EXPECT_EQ(FirstCode(errors[0]), 24768) << "it is ready";
-    branches[1] = New<OCITrans>(OCI_HTYPE_TRANS);
-    EXPECT_EQ(prepare(), OCI_ERROR);
-    EXPECT_EQ(FirstCode(errors[1]), 24771) << "without a name";
-    std::swap(branches[0], branches[1]);
-    EXPECT_EQ(prepare(), OCI_ERROR);
-    EXPECT_EQ(FirstCode(errors[1]), 24781) << "the first has none";
-    OCITrans* one_missing[2] = {branches[0], nullptr};
-    EXPECT_EQ(OCITransMultiPrepare(svc_[1], 2, one_missing, errors), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCITransMultiPrepare(svc_[1], 0, branches, errors), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCITransMultiPrepare(svc_[1], 2, branches, nullptr), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Answer(OCITransCommit(svc_[0], err_, OCI_TRANS_TWOPHASE)), 0);
-    EXPECT_EQ(Run(1, "insert into t select 1 / count(*) from t"), 0);
-}
-
-// A deferred foreign key that is broken ends the branch, in the first phase as in the only one.
-TEST_F(Transactions, WhatWasDeferredIsChecked) {
-    MUST(Run(0, "create table p(id integer primary key)"),
-         Run(0, "create table c(id integer references p deferrable initially deferred)"));
-    for (const auto end : {OCITransPrepare, OCITransCommit}) {
-        MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into c values(7)"));
-        EXPECT_EQ(Answer(end(svc_[0], err_, OCI_DEFAULT)), 2091);
-        EXPECT_EQ(Answer(OCITransCommit(svc_[1], err_, OCI_TRANS_TWOPHASE)), 24756);
-        EXPECT_EQ(Answer(OCITransDetach(svc_[0], err_, OCI_DEFAULT)), 25352);
-        SHOULD(Run(0, "insert into p select 1 / (case count(*) when 0 then 1 else 0 end) from c"),
-               Answer(OCITransRollback(svc_[0], err_, OCI_DEFAULT)));
-    }
 }
 
 // A statement that rolls all back by itself ends the branch's work, and the branch with its next call.
