@@ -17,16 +17,20 @@ TEST_F(NlsCalls, TextsAreConverted) {
     const struct { ub2 set; std::string_view text, utf8; } cases[] = {
         {178, "Z\xfcr\x80", "Zür€"}, {171, "\xc4\xe0", "Да"}, {46, "\xa4\xe9", "€é"}, {170, "\xa3\x9f", "Łź"},
         {31, "\x80\xe9", "\u0080é"}, {1, "az~", "az~"}, {2000, {"\0\xe9\xd8=\xde\0", 6}, "é😀"}, {871, "é", "é"}};
-    for (const auto& c : cases) {
-        char area[20] = "";
-        size_t length = 0;
-        EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 873, area, sizeof area, c.set, c.text.data(), c.text.size(),
-                                              &length)), 0);
-        EXPECT_EQ(std::string_view(area, length), c.utf8) << c.set;
-        EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, c.set, area, sizeof area, 873, c.utf8.data(), c.utf8.size(),
-                                              &length)), 0);
-        EXPECT_EQ(std::string_view(area, length), c.text) << c.set;
+    for (const ub2 own : {873, 1000}) {    // the environment's has no say
+        Nls(own);
+        for (const auto& c : cases) {
+            char area[20] = "";
+            size_t length = 0;
+            EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 873, area, sizeof area, c.set, c.text.data(), c.text.size(),
+                                                  &length)), 0);
+            EXPECT_EQ(std::string_view(area, length), c.utf8) << c.set;
+            EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, c.set, area, sizeof area, 873, c.utf8.data(), c.utf8.size(),
+                                                  &length)), 0);
+            EXPECT_EQ(std::string_view(area, length), c.text) << c.set;
+        }
     }
+    Nls(873);
     const struct { ub2 to, from; std::string_view text; size_t room; sb4 answer; std::string_view result; } edges[] = {
         {31, 873, "€😁é", 9, 0, "??\xe9"}, {1, 873, "é", 9, 0, "?"}, {873, 1, "\x80", 9, 24501, ""},
         {873, 178, "\x81", 9, 24501, ""}, {31, 873, "\xc3", 9, 24501, ""}, {873, 31, "a\xe9", 2, 22059, "a"},

@@ -42,6 +42,12 @@ TEST_F(Blocks, ThatFail) {
 
 // Savepoints of the application: one from before the block takes the block's own mark with it when the block goes back
 // to it, and what follows is undone all the same; one set in the block is there after it.
+TEST_F(Blocks, CommitsThatFail) {
+    MustRun("create table c(id integer references t deferrable initially deferred)", "commit");
+    EXPECT_EQ(Run("begin insert into c values(77); commit; insert into c values(88); end;"), 2091);
+    EXPECT_EQ(One("select count(*) from c"), "0");
+}
+
 TEST_F(Blocks, GoBackToSavepoints) {
     const struct { const char* block; sb4 answer; const char* left; sb4 to_inner; const char* then; } cases[] = {
         {"begin insert into t values(9); rollback to a; insert into t values(3); insert into t values(3); end;", 1, "1",
