@@ -1,4 +1,4 @@
-// Packed decimal, decimal floats, numbers from text, tagged memory, message texts.
+// Packed decimal, numbers from text, tagged memory, message texts.
 #include <gtest/gtest.h>
 #include <unistd.h>
 
@@ -11,7 +11,6 @@
 #include <string>
 #include <vector>
 
-#include "platform/decimal_float.h"
 #include "platform/memory.h"
 #include "platform/message_catalogue.h"
 #include "platform/message_texts.h"
@@ -22,22 +21,6 @@ namespace {
 
 using namespace std::string_literals;
 
-TEST(PackedDecimal, ToText) {
-    const struct { std::string packed; unsigned precision; int scale; const char* text; int result; } cases[] = {
-        {"\x12\x34\x5D", 5, 2, "-123.45", 0}, {"\x12\x34\x0D", 5, 2, "-123.40", 0}, {"\x12\x34\x5C", 5, 0, "12345", 0},
-        {"\x00\x00\x0D"s, 5, 2, "0.00", 0},
-        {"\x00\x00\x5B"s, 5, 2, "-0.05", 0}, {"\x01\x2F", 2, 2, "0.12", 0}, {"\x01\x2A", 2, 4, "0.0012", 0},
-        {"\x12\x3E", 3, 3, "0.123", 0}, {"\x12\x3C", 3, -2, "12300", 0}, {"\x00\x0C"s, 3, -2, "0", 0},
-        {"\x7C", 1, 0, "7", 0}, {"\xC", 0, 0, "0", 0}, {"\x12\x34\x59", 5, 2, "", kDecimalBadSign},
-        {"\x1A\x34\x5C", 5, 2, "1", kDecimalBadDigit}, {"\x12\x34\xBC", 5, 2, "123.4", kDecimalBadDigit}};
-    for (const auto& c : cases) {
-        char text[64] = "?";
-        const auto* packed = reinterpret_cast<const unsigned char*>(c.packed.data());
-        EXPECT_EQ(DecimalToText(packed, c.precision, c.scale, text, sizeof text), c.result) << c.text;
-        EXPECT_STREQ(text, c.text);
-    }
-}
-
 TEST(PackedDecimal, ToTextOfEveryCapacity) {
     const std::string whole = "-123.45";
     for (std::size_t capacity = 0; capacity < 10; ++capacity) {
@@ -47,32 +30,6 @@ TEST(PackedDecimal, ToTextOfEveryCapacity) {
         EXPECT_EQ(result, capacity > whole.size() ? kDecimalDone : kDecimalTooShort) << capacity;
         const std::string text = capacity == 0 ? "" : area.data();
         EXPECT_EQ(text, whole.substr(0, capacity == 0 ? 0 : capacity - 1));
-    }
-}
-
-TEST(PackedDecimal, FromText) {
-    const struct { const char* text; unsigned precision; int scale; std::string packed; } cases[] = {
-        {"-123.45", 5, 2, "\x12\x34\x5D"}, {"\t+1.5 ", 5, 2, "\x00\x15\x0C"s}, {"1.5", 1, 0, "\x2C"}, {"0.0", 5, 2, "\x00\x00\x0C"s},
-        {"-0", 5, 2, "\x00\x00\x0C"s}, {"1.005", 3, 2, "\x10\x1C"}, {"-1.0049", 3, 2, "\x10\x0D"},
-        {"9.995", 4, 2, "\x01\x00\x0C"s}, {".5", 1, 0, "\x1C"}, {"0.04", 1, 1, "\x0C"}, {"-0.04", 1, 1, "\x0C"},
-        {"0.004", 1, 1, "\x0C"}, {"12e2", 4, 0, "\x01\x20\x0C"s}, {"1234e-2", 4, 2, "\x01\x23\x4C"},
-        {"1e-999999999999", 3, 2, "\x00\x0C"s}, {"12345", 3, -2, "\x12\x3C"}, {"000000123", 3, 0, "\x12\x3C"},
-        {"0e999999", 3, 0, "\x00\x0C"s}};
-    for (const auto& c : cases) {
-        std::string packed(PackedDecimalSize(c.precision), '?');
-        auto* area = reinterpret_cast<unsigned char*>(packed.data());
-        EXPECT_EQ(TextToDecimal(c.text, area, c.precision, c.scale), kDecimalDone) << c.text;
-        EXPECT_EQ(packed, c.packed) << c.text;
-    }
-    const struct { const char* text; unsigned precision; int scale; int result; } refused[] = {
-        {"1000", 5, 2, kDecimalOverflow}, {"999.995", 5, 2, kDecimalOverflow}, {"1e9999999999", 5, 2, kDecimalOverflow},
-        {"", 5, 2, kDecimalBadText}, {".", 5, 2, kDecimalBadText}, {"1.2.3", 5, 2, kDecimalBadText},
-        {"12x", 5, 2, kDecimalBadText}, {"1e", 5, 2, kDecimalBadText}, {"--1", 5, 2, kDecimalBadText},
-        {nullptr, 5, 2, kDecimalBadText}};
-    for (const auto& c : refused) {
-        unsigned char packed[3] = {1, 2, 3};
-        EXPECT_EQ(TextToDecimal(c.text, packed, c.precision, c.scale), c.result) << (c.text ? c.text : "null");
-        EXPECT_EQ(packed[0], 1);
     }
 }
 
@@ -185,31 +142,6 @@ std::string Hex(const void* bytes, std::size_t size) {
         hex += pair;
     }
     return hex;
-}
-
-TEST(DecimalFloat, FromText) {
-    const struct {
-        const char* text;
-        std::size_t size;
-        const char* hex;  // least significant byte first
-    } cases[] = {
-        {"0", 8, "000000000000C031"}, {"0E500", 8, "000000000000C031"}, {"-0.00", 8, "000000000000C0B1"},
-        {"1", 8, "010000000000C031"}, {"-1", 8, "010000000000C0B1"}, {"12.5", 8, "7D0000000000A031"},
-        {"9999999999999999", 8, "FFFFC06FF286736C"}, {"99999999999999995", 8, "0080C6A47E8D0332"},
-        {"1E384", 8, "0080C6A47E8DE35F"}, {"1E-398", 8, "0100000000000000"}, {"4E-399", 8, "0000000000000000"},
-        {"5E-399", 8, "0100000000000000"}, {"9999999999999999E-414", 8, "0100000000000000"},
-        {"9999999999999999E-415", 8, "0000000000000000"}, {"1E-500", 8, "0000000000000000"}, {"1", 16, "01000000000000000000000000004030"},
-        {"-0.1", 16, "01000000000000000000000000003EB0"}};
-    for (const auto& c : cases) {
-        unsigned char bytes[16];
-        ASSERT_TRUE(decimal_float::FromText(c.text, c.size, bytes)) << c.text;
-        EXPECT_EQ(Hex(bytes, c.size), c.hex) << c.text << " in " << c.size;
-    }
-    for (const char* text : {"", "-", ".", "1.2.3", "1E", "1E5x", "1E385", "1E2000000", "one"}) {
-        unsigned char bytes[] = "untouched";
-        EXPECT_FALSE(decimal_float::FromText(text, 8, bytes)) << text;
-        EXPECT_STREQ(reinterpret_cast<char*>(bytes), "untouched") << text;
-    }
 }
 
 TEST(PackedDecimal, DigitsOfTheBytes) {
