@@ -59,61 +59,12 @@ std::string Names(const sql::StatementText& statement) {
     return names;
 }
 
-TEST(SqlText, KindOfStatement) {
-    const struct { const char* text; StatementType type; sql::Run run; int function_code; } cases[] = {
-        {"select 1 from dual", StatementType::select, sql::Run::query, 4},
-        {" -- note\n /* and */ SeLeCt 1", StatementType::select, sql::Run::query, 4},
-        {"(select 1) union (select 2)", StatementType::select, sql::Run::query, 4},
-        {"values(1)", StatementType::select, sql::Run::query, 4},
-        {"with a as (select 1) select * from a", StatementType::select, sql::Run::query, 4},
-        {"with a(x) as (select 1) insert into t select x from a", StatementType::insert, sql::Run::change, 3},
-        {"update t set a = 1", StatementType::update, sql::Run::change, 5},
-        {"delete from t", StatementType::remove, sql::Run::change, 9},
-        {"merge into t using u on (1=1)", StatementType::merge, sql::Run::change, 189},
-        {"create or replace view v as select 1", StatementType::create, sql::Run::definition, 10},
-        {"create unique index i on t(a)", StatementType::create, sql::Run::definition, 20},
-        {"drop table t", StatementType::drop, sql::Run::definition, 8},
-        {"alter table t add c number", StatementType::alter, sql::Run::definition, 26},
-        {"call p(1)", StatementType::call, sql::Run::change, 34},
-        {"begin null; end;", StatementType::begin, sql::Run::nothing, 34},
-        {"begin", StatementType::begin, sql::Run::begin, 34},
-        {"begin transaction;", StatementType::begin, sql::Run::begin, 34},
-        {"commit work", StatementType::unknown, sql::Run::commit, 54},
-        {"rollback", StatementType::unknown, sql::Run::rollback, 55},
-        {"rollback to savepoint a", StatementType::unknown, sql::Run::savepoint, 55},
-        {"savepoint a", StatementType::unknown, sql::Run::savepoint, 56},
-        {"explain select 1", StatementType::unknown, sql::Run::other, 27},
-        {"explain update t set a = 1", StatementType::unknown, sql::Run::other, 27},
-        {"begin exclusive", StatementType::begin, sql::Run::begin, 34},
-        {"explain plan for select 1", StatementType::unknown, sql::Run::other, 27},
-        {"explain query plan select 1", StatementType::unknown, sql::Run::other, 27},
-        {"with commit(x) as (select 1) insert into t select x from commit", StatementType::insert, sql::Run::change, 3},
-    };
-    for (const auto& c : cases) {
-        const sql::StatementText statement = sql::Scan(c.text);
-        ASSERT_EQ(statement.steps.size(), 1u) << c.text;
-        EXPECT_EQ(statement.type, c.type) << c.text;
-        EXPECT_EQ(statement.steps[0].run, c.run) << c.text;
-        EXPECT_EQ(statement.function_code, c.function_code) << c.text;
-    }
-}
-
-TEST(SqlText, PlaceholdersOutsideOfQuotesAndComments) {
+TEST(SqlText, PlaceholdersForRowIds) {
     const struct { const char* text; const char* names; } cases[] = {
-        {"select :a, ':b', \":c\", q'[:d']' /* :e */ from t -- :f\n where x = :1", "A 1"},
-        {"insert into t values(?, ?, :x)", "1 2 X"}, {"select :name, :NAME, :\"name\"", "NAME +NAME name"},
-        {"insert into t values(:a:ind, :b)", "A/IND B"}, {"select 'it''s :a', x::text, :b::text", "B"},
         {"select * from t where rowid = :r and :s < t.rowid and rowid in (:u, 'x', :v) and a = :w", "@R @S @U @V W"},
-        {"select :\xc3\xa4rger", "\xc3\xa4RGER"},
-        {"create trigger g after insert on t begin insert into l values(:new.a); end;", ""}, {"select : a", ""},
-        {"select /**/:a, /***/:b, 1e-:c, 1e+5:d, q:e from t /*/:f*/ where rowid <:g", "A B C D E @G"},
+        {"insert into t values(:a:ind, :b, :a)", "A/IND B +A"}, {"select /*/:f*/ :a from t where rowid <:g", "A @G"},
     };
     for (const auto& c : cases) EXPECT_EQ(Names(sql::Scan(c.text)), c.names) << c.text;
-}
-
-TEST(SqlText, BindPositions) {
-    EXPECT_EQ(sql::Scan("select :a, :b, :a").positions, (std::vector<std::uint32_t>{0, 1, 2}));
-    EXPECT_EQ(sql::Scan("begin :x := :a + :a; :y := :b; end;").positions, (std::vector<std::uint32_t>{0, 1, 3, 4}));
 }
 
 TEST(SqlText, Blocks) {
@@ -132,36 +83,6 @@ TEST(SqlText, Blocks) {
     EXPECT_EQ(sql::Scan("begin :x := :y * 2; end;").steps[0].targets, std::vector<std::uint32_t>{0});
     EXPECT_EQ(sql::Scan("begin select a, b into :x, :y from t; end;").steps[0].targets,
               (std::vector<std::uint32_t>{0, 1}));
-}
-
-TEST(SqlText, ReturningInto) {
-    const char* text = "insert into t values(:a) returning id, b into :id, :b";
-    const sql::StatementText statement = sql::Scan(text);
-    EXPECT_TRUE(statement.Returning());
-    EXPECT_EQ(statement.steps[0].targets, (std::vector<std::uint32_t>{1, 2}));
-    EXPECT_EQ(Rewritten(text), "insert into t values(?1) returning id, b ");
-    EXPECT_FALSE(sql::Scan("insert into t select :a from u").Returning());
-}
-
-TEST(SqlText, WhatTheTextTellsToBeWrong) {
-    const struct { const char* text; int error; unsigned offset; } cases[] = {
-        {"select 'abc", 1756, 7}, {"select \"abc", 1756, 7}, {"select q'[abc]", 1756, 7},
-        {"select 1; select 2", 933, 10}, {"", 900, 0}, {" -- nothing", 900, 11}, {"selection", 900, 0}, {"end", 900, 0},
-        {"End;", 900, 0}, {"/* */ pragma page_size", 900, 6}, {"attach 'x' as y", 900, 0}, {"detach y", 900, 0},
-        {"vacuum", 900, 0}, {"reindex", 900, 0}, {"explain pragma page_size", 900, 0}, {"; pragma page_size", 900, 0},
-        {"begin open :c for select 1 end;", 6550, 31}, {"begin if x then null; end if; end;", 6550, 6},
-        {"begin open :c for ; end;", 6550, 6}, {"begin open :c as select 1; end;", 6550, 6}, {"begin select 1 from t; end;", 6550, 6},
-        {"begin null; end; select 1", 6550, 17}, {"begin null;", 6550, 11},
-        {"declare x number; begin null; end;", 6550, 0}, {"begin end;", 6550, 0}, {"begin explain select 1; end;", 6550, 6}, {"begin x := 1; end;", 6550, 6},
-    };
-    for (const auto& c : cases) {
-        const sql::StatementText statement = sql::Scan(c.text);
-        EXPECT_EQ(statement.error, c.error) << c.text;
-        EXPECT_EQ(statement.error_offset, c.offset) << c.text;
-    }
-    EXPECT_EQ(sql::Scan(std::string_view("select 1\0", 9)).error, 911);
-    EXPECT_EQ(sql::Scan("select 1 ; ;").error, 0);
-    EXPECT_EQ(sql::Scan(std::string_view("select q'").substr(0, 8)).error, 0);
 }
 
 TEST(SqlText, SpellingsOfTheEngine) {
