@@ -1,5 +1,5 @@
 // Pools: who gets which session, what a full pool answers, what ends do, and many threads at once. Refusals that a
-// script shows stand in transcripts/pools.
+// script shows stand in transcripts/pool_states.
 #include <atomic>
 #include <chrono>
 #include <mutex>
@@ -244,58 +244,6 @@ TEST_F(Pools, WhoWaitsComesFirst) {
         if (waits.joinable()) waits.join();
     }
     EXPECT_LT(overtaken, 6) << "it may not have waited yet on a busy machine; without an order nearly all are";
-}
-
-TEST_F(Pools, AServerAttachedToAConnectionPool) {
-    auto* pool = New<OCICPool>(OCI_HTYPE_CPOOL);
-    OraText* name = nullptr;
-    sb4 length = 0;
-    sb4 lengths[] = {4, static_cast<sb4>(ann_.size()), 6};
-    const auto create = [&](const char* database, const char* password, ub4 mode, ub4 least = 0) {
-        lengths[0] = lengths[0] < 0 ? -1 : static_cast<sb4>(Length(database));
-        return Answer(OCIConnectionPoolCreate(env_, err_, pool, &name, &length, Text(database), lengths[0], least, 1, 1,
-                                              Text(ann_), lengths[1], Text(password), password ? lengths[2] : 0, mode));
-    };
-    for (sb4& wrong : lengths) {
-        const sb4 right = std::exchange(wrong, -1);
-        EXPECT_EQ(create("work", "secret", 0), 24405);
-        wrong = right;
-    }
-    EXPECT_EQ(create("work", nullptr, 0), 1005);
-    EXPECT_EQ(create("/nowhere/x.db", "secret", 0), 24400);
-    EXPECT_EQ(create("work", "secret", 1), 24393);
-    EXPECT_EQ(create("work", "secret", OCI_CPOOL_REINITIALIZE), 24395);
-    ASSERT_EQ(create("work", "secret", 0), 0);
-    EXPECT_EQ(create("work", "secret", 0), 24407);
-    const auto size = [&](ub4 attribute) { return Attribute<ub4>(pool, OCI_HTYPE_CPOOL, attribute); };
-    EXPECT_EQ(size(OCI_ATTR_CONN_MIN) * 100 + size(OCI_ATTR_CONN_MAX) * 10 + size(OCI_ATTR_CONN_INCR), 11u);
-    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
-    for (const sb4 answer : {0, 24309}) ASSERT_EQ(Answer(OCIServerAttach(server, err_, name, length, OCI_CPOOL)), answer);
-    auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
-    OCISession* sessions[] = {User(ann_.c_str(), "secret"), User(ann_.c_str(), "secret")};
-    ub1 no_wait = 2;    // anything but 0
-    ASSERT_EQ(Answer(OCIAttrSet(pool, OCI_HTYPE_CPOOL, &no_wait, 0, OCI_ATTR_CONN_NOWAIT, err_)), 0);
-    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[0], OCI_CRED_RDBMS, 0)), 0);
-    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[1], OCI_CRED_RDBMS, 0)), 24401);
-    const auto counts = [&] {
-        return Attribute<ub4>(pool, OCI_HTYPE_CPOOL, OCI_ATTR_CONN_OPEN_COUNT) * 10 +
-               Attribute<ub4>(pool, OCI_HTYPE_CPOOL, OCI_ATTR_CONN_BUSY_COUNT);
-    };
-    EXPECT_EQ(counts(), 11u);
-    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, sessions[0], 0)), 0);
-    EXPECT_EQ(counts(), 10u);
-    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, sessions[1], OCI_CRED_RDBMS, 0)), 0);
-    EXPECT_EQ(Answer(OCIServerDetach(server, err_, 0)), 0);
-    EXPECT_EQ(counts(), 0u) << "a detach closes";
-    EXPECT_EQ(create("work", "secret", OCI_CPOOL_REINITIALIZE, 1), 0);
-    EXPECT_EQ(counts(), 10u) << "filled up to the least";
-    OCISvcCtx* refused = nullptr;
-    for (const auto& [mode, answer] : {std::pair(OCI_LOGON2_PROXY, 24419), {OCI_LOGON2_CPOOL | OCI_LOGON2_SPOOL, 24300}})
-        EXPECT_EQ(Answer(OCILogon2(env_, err_, &refused, Text(ann_), Length(ann_.c_str()), Text("secret"), 6, name,
-                                   static_cast<ub4>(length), static_cast<ub4>(mode))), answer);
-    EXPECT_EQ(Answer(OCIConnectionPoolDestroy(pool, err_, 1)), 24394);
-    EXPECT_EQ(Answer(OCIConnectionPoolDestroy(pool, err_, 0)), 0);
 }
 
 TEST_F(Pools, ManyThreadsShareAFewSessions) {
