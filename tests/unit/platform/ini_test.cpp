@@ -50,18 +50,6 @@ protected:
     std::filesystem::path home_;
 };
 
-TEST_F(Ini, ReadsAsWritten) {
-    Put("\xEF\xBB\xBF[ KelpCI ]\r\n; c=1\n#d=1\n  Trace = on ; really \r\nempty=\nnot a setting\ntrace=off\n"
-        "[other]\ntrace=other\n[kelpci]\nlast==x=");
-    const struct { const char* section; const char* key; const char* value; } cases[] = {
-        {"kelpci", "trace", "on ; really"}, {"KELPCI", "TRACE", "on ; really"}, {"other", "trace", "other"},
-        {"kelpci", "empty", ""}, {"kelpci", "last", "=x="}, {"kelpci", "; c", "none"}, {"kelpci", "d", "none"},
-        {"kelpci", "not a setting", "none"}, {"nowhere", "trace", "none"}, {"kelpci", "", "none"}};
-    for (const auto& c : cases) EXPECT_EQ(Read(c.section, c.key), c.value) << c.section << ", " << c.key;
-    EXPECT_EQ(Read("kelpci", nullptr), "Trace\0empty\0last\0"s);
-    EXPECT_EQ(Read("nowhere", nullptr), "");
-}
-
 TEST_F(Ini, AreasOfEveryLength) {
     Put("[s]\nkey=value\nother=1\n");
     for (std::size_t capacity = 0; capacity < 8; ++capacity)
