@@ -21,19 +21,6 @@ TEST(Trace, CodesWithoutALine) {
         EXPECT_EQ(Trace(code, 0, "x"), "outputOCI (): unrecognized command!\n") << code;
 }
 
-TEST(Commands, TheFirstRowThatTheWordBegins) {
-    const struct { const char* word; int code; } cases[] = {    // 0: none
-        {"e", 76}, {"EXIT", 76}, {"ex", 76}, {"q", 76}, {"o", 50}, {"r", 77}, {"ocil", 203}, {"ocilogon", 206},
-        {"ocilogon2", 207}, {"OCIStmtFetch", 312}, {"ocistmtfetch2", 313}, {"sqll", 445}, {"sqlld2", 452}, {"xa", 368},
-        {"xar", 192}, {"ocithreadi", 389}, {"ocithreadisMULTI", 382}, {"olo", 414}, {"ologof", 415}, {"get", 448},
-        {"getm", 319}, {"exitx", 0}, {"", 0}, {"ocistmtexecutes", 0}, {"#", 0},
-    };
-    for (const auto& c : cases) {
-        const Command* command = FindCommand(c.word);
-        EXPECT_EQ(command == nullptr ? 0 : static_cast<int>(command->code), c.code) << c.word;
-    }
-}
-
 TEST(Commands, NoWordHidesAnother) {
     int rows = 0;
     for (const Command* row = kCommandTable; row->word != nullptr; ++row, ++rows)
@@ -73,18 +60,6 @@ TEST(Diagnostics, TheServerTagIsTheSameForEveryServer) {
     EXPECT_TRUE(ReadDiagnostic(reinterpret_cast<const char*>(wide.data()), 2 * wide.size(), text));
     Utf16Mode = false;
     EXPECT_EQ(text, std::string(1024, 'x'));
-}
-
-TEST(WordCounts, WhatEachFormHolds) {
-    EXPECT_TRUE(Words(3, 5).Has(3));
-    EXPECT_FALSE(Words(3, 5).Has(4));
-    EXPECT_TRUE(WordsBetween(2, 4).Has(4));
-    EXPECT_FALSE(WordsBetween(2, 4).Has(5));
-    EXPECT_TRUE(WordsFrom(4).Has(4));
-    EXPECT_TRUE(WordsFrom(4).Has(1024));
-    EXPECT_FALSE(WordsFrom(4).Has(3));
-    EXPECT_TRUE(kAnyWords.Has(1));
-    EXPECT_TRUE(kAnyWords.Has(64));
 }
 
 }  // namespace
