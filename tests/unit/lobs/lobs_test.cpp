@@ -49,36 +49,6 @@ protected:
     OCILobLocator* other = nullptr;
 };
 
-TEST_F(Lobs, CharactersAreCounted) {
-    Fetch(lob);
-    EXPECT_EQ(LengthOf(lob), 11u);
-    EXPECT_EQ(Read(lob, 4, 2), "4:\xC3\xA4llo");
-    EXPECT_EQ(Read(lob, 3, 10), "2:ld");                       // the amount shrinks at the end
-    EXPECT_EQ(Read(lob, 3, 12), "!100");
-    EXPECT_EQ(Write(lob, 2, "e"), 0);                          // shorter than what it replaces
-    EXPECT_EQ(Read(lob), "11:hello world");
-    EXPECT_EQ(Write(lob, 5, "\xC3\xB6\xE2\x82\xAC"), 0);       // longer
-    EXPECT_EQ(Read(lob), "11:hell\xC3\xB6\xE2\x82\xACworld");
-    EXPECT_EQ(Write(lob, 14, "!"), 0);                         // behind a gap
-    EXPECT_EQ(Read(lob, 9, 6), "9:\xE2\x82\xACworld  !");
-    EXPECT_EQ(Stored(), "hell\xC3\xB6\xE2\x82\xACworld  !");
-    ub4 erased = 100;
-    EXPECT_EQ(Answer(OCILobErase(svc, err, lob, &erased, 12)), 0);
-    EXPECT_EQ(erased, 3u);
-    EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 6)), 0);
-    EXPECT_EQ(Read(lob, 0), "6:hell\xC3\xB6\xE2\x82\xAC");
-    EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 7)), 22926);
-    MustRun("rollback");
-    EXPECT_EQ(Stored(), "h\xC3\xA4llo world");
-    EXPECT_EQ(Write(lob, 1, "x"), 22990);
-    std::string many = "\xC3\xA4";                             // of every width, at every place in a word
-    for (int count = 0; count < 1000; ++count) many += "a\xE2\x82\xAC\xF0\x90\x8D\x88" "ab";
-    Temporary(other);
-    EXPECT_EQ(Write(other, 1, many), 0);
-    EXPECT_EQ(LengthOf(other), 5001u);
-    EXPECT_EQ(Read(other, 3, 4998), "3:\xE2\x82\xAC\xF0\x90\x8D\x88" "a");
-}
-
 TEST_F(Lobs, Utf16IsConvertedBothWays) {
     Temporary(lob);
     std::string data("a\0\xE4\0\x3D\xD8\x00\xDE", 8);          // a, a-umlaut, and a character of two units
@@ -277,35 +247,14 @@ TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
     for (int round = 0; round < 2; ++round) EXPECT_EQ(Read(lob, 1, 40000) + Read(other, 1, 40000), "1:a1:b");
 }
 
-TEST_F(Lobs, CopiesStayWithinTheirKind) {
+TEST_F(Lobs, FormsOfEachKind) {
     OCILobLocator* binary = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
     Fetch(lob);
     Fetch(binary, "select b from l for update", SQLT_BLOB);
-    Temporary(other);
-    MUST(Write(other, 1, "12\xC3\xB6" "4"), Answer(OCILobCopy(svc, err, lob, other, 100, 3, 2)));
-    EXPECT_EQ(Read(lob), "11:h\xC3\xA4" "2\xC3\xB6" "4 world");
-    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 9, 11, 4)), 0);    // the last one
-    EXPECT_EQ(Read(lob, 9, 9), "3:rl4");
-    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, lob, 1, 11, 10)), 0);
-    EXPECT_EQ(Read(lob, 9, 9), "3:rll");
-    EXPECT_EQ(Write(lob, 11, "d"), 0);
-    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, lob, 5, 2, 1)), 0);    // onto itself
-    EXPECT_EQ(Read(lob), "11:hh\xC3\xA4" "2\xC3\xB6" "4world");
-    EXPECT_EQ(Answer(OCILobAppend(svc, err, other, other)), 0);
-    EXPECT_EQ(Read(other), "8:12\xC3\xB6" "412\xC3\xB6" "4");
-    const struct { OCILobLocator *to, *from; ub4 amount, at, source; sb4 answer; } refused[] = {
-        {lob, other, 1, 1, 9, 22994}, {lob, other, 1, 0, 1, 24801}, {lob, other, 1, 1, 0, 24801},
-        {lob, other, 0, 1, 1, 24801}, {lob, binary, 1, 1, 1, 24805}, {binary, lob, 1, 1, 1, 24805}};
-    for (const auto& c : refused)
-        EXPECT_EQ(Answer(OCILobCopy(svc, err, c.to, c.from, c.amount, c.at, c.source)), c.answer) << c.answer;
-    EXPECT_EQ(Read(binary), std::string("3:\1\2\3"));
     char bytes[4];
     oraub8 count = 0;    // of characters, which bytes are not counted by
     EXPECT_EQ(Answer(OCILobRead2(svc, err, binary, nullptr, &count, 1, bytes, 4, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
     EXPECT_EQ(count, 3u);
-    ASSERT_EQ(Write(other, 1, std::string(100000, 'a')), 0);
-    EXPECT_EQ(Answer(OCILobCopy(svc, err, lob, other, 100000, 1, 1)), 0);    // in several steps
-    EXPECT_EQ(LengthOf(lob), 100000u);
     MustRun("create table n(n nclob)", "insert into n values('x')");
     Fetch(other, "select n from n", SQLT_DBCLOB);
     EXPECT_EQ(Answer(OCILobAppend(svc, err, lob, other)), 24806);
@@ -319,48 +268,6 @@ TEST_F(Lobs, CopiesStayWithinTheirKind) {
         EXPECT_EQ(Answer(OCILobCharSetId(env, err, c.of, &set)), 0);
         EXPECT_EQ(set, c.set);
     }
-}
-
-// As bytes or their digits, no more than there is room for; what a locator of the other kind would be filled with is refused.
-TEST_F(Lobs, ValuesInPlainAreas) {
-    std::string digits = "1", zeros(80, '0');    // an odd count, whose first digit is a byte of its own
-    for (int pair = 0; pair < 50; ++pair) digits += "45";
-    MustRun("create table n(c clob, b blob)", "insert into n values('" + digits + "', x'" + zeros + "')");
-    const struct { const char* sql; ub2 type; sb4 size, answer; std::string_view area; sb2 indicator; } cases[] = {
-        {"select b from l", SQLT_BIN, 4, 0, "\1\2\3#", 0},
-        {"select b from l", SQLT_VBI, 4, 1406, {"\2\0\1\2", 4}, 3}, {"select b from l", SQLT_CHR, 6, 0, "010203", 0},
-        {"select b from n", SQLT_BIN, 2, 1406, {"\0\0", 2}, 40}, {"select c from n", SQLT_BIN, 2, 1406, "\x01\x45", 51},
-        {"select c from l", SQLT_BIN, 4, 1465, "####", 9}, {"select b from n", SQLT_CHR, 3, 1406, "000", 80}};
-    for (const auto& c : cases) {
-        std::string area(static_cast<std::size_t>(c.size), '#');
-        sb2 indicator = 9;
-        EXPECT_EQ(Query(c.sql, {{area.data(), c.size, c.type, &indicator}}), c.answer);
-        EXPECT_EQ(area, c.area) << c.sql;
-        EXPECT_EQ(indicator, c.indicator) << c.sql;
-    }
-    const struct { const char* sql; ub2 type; } refused[] = {
-        {"select c from l", SQLT_BLOB}, {"select b from l", SQLT_CLOB}, {"select 'abc' from dual", SQLT_BLOB}, {"select x'01' from dual", SQLT_CLOB}};
-    for (const auto& c : refused) EXPECT_EQ(Query(c.sql, {Locator(lob, c.type)}), 932) << c.sql;
-    Fetch(lob, "select x'0102' from dual", SQLT_BLOB);
-    EXPECT_EQ(Read(lob), "2:\1\2");
-}
-
-TEST_F(Lobs, EmptyOnesOfTheApplication) {
-    for (ub4 value : {1u, 0u})
-        EXPECT_EQ(Answer(OCIAttrSet(lob, OCI_DTYPE_LOB, &value, 0, OCI_ATTR_LOBEMPTY, err)), value == 0 ? 0 : 24328);
-    boolean flag = TRUE;
-    EXPECT_EQ(Answer(OCILobIsTemporary(env, err, lob, &flag)), 0);
-    EXPECT_EQ(flag, FALSE);
-    EXPECT_EQ(Write(lob, 1, "x"), 22275);
-    for (const ub2 type : {SQLT_CLOB, SQLT_BLOB}) {
-        char seen[8] = "";
-        MUST(Ready("select quote(:1) from dual", {Locator(lob, type)}), Define(1, Text(seen)) + Execute(1));
-        EXPECT_STREQ(seen, type == SQLT_CLOB ? "''" : "X''");
-    }
-    MUST(Ready("insert into l values(9, :1, :2)", {Locator(lob), Locator(lob, SQLT_BLOB)}), Execute());
-    EXPECT_EQ(One("select length(c) + 10 * length(b) from l where k = 9"), "0");
-    Fetch(lob, "select b from l where k = 9", SQLT_BLOB);
-    EXPECT_EQ(LengthOf(lob), 0u);
 }
 
 TEST_F(Lobs, BindsAndReturningTakeLocators) {
@@ -385,26 +292,6 @@ TEST_F(Lobs, BindsAndReturningTakeLocators) {
     EXPECT_EQ(flag, TRUE);
     SHOULD(Answer(OCILobLocatorAssign(svc, err, lob, &other)), Write(other, 1, "x"));
     EXPECT_EQ(Read(lob, 2) + Read(other, 2), "2:of2:xf");      // a copy of its own
-}
-
-TEST_F(Lobs, OpeningIsPerTransaction) {
-    Fetch(lob, "select c from l");
-    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 22292);
-    EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 22289);
-    Fetch(lob);
-    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, 7)), 24801);
-    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READONLY)), 0);
-    EXPECT_EQ(Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)), 22293);
-    EXPECT_EQ(Write(lob, 1, "x"), 22294);
-    SHOULD(Answer(OCILobClose(svc, err, lob)), Answer(OCILobOpen(svc, err, lob, OCI_LOB_READWRITE)));
-    EXPECT_EQ(Write(lob, 1, "x"), 0);
-    boolean open = FALSE;
-    EXPECT_EQ(Answer(OCILobIsOpen(svc, err, lob, &open)), 0);
-    EXPECT_EQ(open, TRUE);
-    EXPECT_EQ(Prepare("commit"), 0);
-    EXPECT_EQ(ExecuteCode(), OCI_SUCCESS_WITH_INFO);
-    EXPECT_EQ(Answer(OCI_ERROR), 22297);
-    EXPECT_EQ(Answer(OCILobClose(svc, err, lob)), 22289);
 }
 
 TEST_F(Lobs, BufferedWritesWait) {

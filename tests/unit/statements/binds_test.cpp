@@ -121,21 +121,6 @@ protected:
     OCIStmt* statement = nullptr;
 };
 
-TEST_F(Cache, Off) {
-    const char* const sql = "select 1 from dual";
-    EXPECT_EQ(Prepare2("", ""), 24430);
-    EXPECT_EQ(Prepare2("", "key"), 24431);
-    EXPECT_EQ(Prepare2(sql, "", OCI_PREP2_CACHE_SEARCHONLY), 24431);
-    EXPECT_EQ(Prepare2(sql, "", 0x20), 24300);
-    ASSERT_EQ(Prepare2(sql), 0);
-    EXPECT_EQ(Prepare(statement, "commit"), 24433);
-    EXPECT_EQ(Release("", 0x20), 24300);
-    EXPECT_EQ(Release(), 0);
-    EXPECT_EQ(OCIStmtRelease(statement, err, nullptr, 0, OCI_DEFAULT), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Kept(sql), 24431);
-    EXPECT_EQ(Answer(OCIStmtRelease(stmt, err, nullptr, 0, OCI_DEFAULT)), 24434);
-}
-
 TEST_F(Cache, KeepsBindsAndLosesTheOldest) {
     TurnOn(2);
     ASSERT_EQ(Prepare2("select 1 from dual") + Release(), 0);
@@ -174,26 +159,6 @@ TEST_F(Cache, KeepsBindsAndLosesTheOldest) {
     EXPECT_EQ(Kept("select 3 from dual"), 24431);
     TurnOn(2);
     PrepareAndRelease("select 4 from dual");    // the logoff that follows finds it kept
-}
-
-// A kept statement shows nothing of its former user's rows.
-TEST_F(Cache, ForgetsWhatTheFormerUserDid) {
-    TurnOn(2);
-    OCIStmt* const outer = stmt;
-    sb4 out[4] = {};
-    for (int user = 0; user < 2; ++user) {
-        ASSERT_EQ(Prepare2("select 1 as a from dual union select 2"), 0);
-        stmt = statement;
-        for (const ub4 counter : {OCI_ATTR_ROW_COUNT, OCI_ATTR_ROWS_FETCHED, OCI_ATTR_PARAM_COUNT,
-                                  OCI_ATTR_CURRENT_POSITION})
-            EXPECT_EQ(Attribute<ub4>(counter), 0u) << counter << " for user " << user;
-        EXPECT_EQ(State(), 1u) << user;
-        ASSERT_EQ(Define(1, Int(out)), 0);
-        ASSERT_EQ(Execute(4), 1403);
-        EXPECT_EQ(RowCount(), 2u);
-        stmt = outer;
-        ASSERT_EQ(Release(), 0);
-    }
 }
 
 // ---- Calls as no application should make them

@@ -25,38 +25,6 @@ protected:
     }
 };
 
-TEST_F(Executing, WhatIsWrongWithTheCall) {
-    MustRun("create table t(a number)");
-    stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-    EXPECT_EQ(Execute(), 24337);
-    EXPECT_EQ(Prepare(""), 24373);
-    const struct { const char* sql; ub4 iterations, first, mode; sb4 answer; } cases[] = {
-        {"insert into t values(1)", 0, 0, OCI_DEFAULT, 24333}, {"insert into t values(1)", 2, 2, OCI_DEFAULT, 24333},
-        {"insert into t values(1)", 1, 3, OCI_DEFAULT, 24333}, {"insert into t values(1)", 1, 0, 0x1000, 24300},
-        {"begin null; end;", 1, 1, OCI_DEFAULT, 24333},
-        {"insert into t values(1)", 1, 0, OCI_DESCRIBE_ONLY | OCI_PARSE_ONLY, 24380},
-        {"insert into t values(:a)", 1, 0, OCI_DEFAULT, 1008},
-        {"insert into t values(1) returning a into :b", 1, 0, OCI_DEFAULT, 1008}, {"create table u(a number)", 2, 0, OCI_DEFAULT, 24969},
-        {"create table u as select :a from t", 1, 0, OCI_DEFAULT, 1027}, {"commit", 2, 0, OCI_DEFAULT, 24969},
-        {"select * from t", 1, 0, OCI_DEFAULT, 24374}, {"select * from missing", 0, 0, OCI_DEFAULT, 942},
-        {"select 'x from t", 0, 0, OCI_DEFAULT, 1756}, {"select 1; select 2", 0, 0, OCI_DEFAULT, 933},
-    };
-    for (const auto& c : cases) {
-        ASSERT_EQ(Prepare(c.sql), 0) << c.sql;
-        EXPECT_EQ(Execute(c.iterations, c.mode, c.first), c.answer) << c.sql;
-    }
-    EXPECT_EQ(One("select count(*) from t"), "0");
-}
-
-TEST_F(Executing, SyntaxErrorsPointIntoTheText) {
-    char dummy[4] = "";
-    ASSERT_EQ(Ready("select :a, sysdate, from dual", {Text(dummy)}), 0);
-    EXPECT_EQ(Execute(0), 900);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 20);
-    ASSERT_EQ(Prepare("select 1 from dual"), 0);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET), 0);
-}
-
 TEST_F(Executing, TruncateEmptiesTheTableForGood) {
     MustRun("create table t(a number)", "insert into t values(1)");
     ASSERT_EQ(Prepare("truncate table t"), 0);
@@ -65,16 +33,6 @@ TEST_F(Executing, TruncateEmptiesTheTableForGood) {
     MustRun("rollback");
     EXPECT_EQ(Rows(), "0");
     EXPECT_EQ(Run("truncate table missing"), 942);
-}
-
-TEST_F(Executing, ParseOnlyRunsNothingAndComesFirst) {
-    MustRun("create table t(a number)");
-    MUST(Prepare("insert into t values(1)"), Execute(1, OCI_PARSE_ONLY), Execute(1, OCI_PARSE_ONLY));
-    EXPECT_EQ(Rows(), "0");
-    EXPECT_EQ(Execute(), 0);
-    EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 24382);
-    ASSERT_EQ(Prepare("insert into missing values(1)"), 0);
-    EXPECT_EQ(Execute(1, OCI_PARSE_ONLY), 942);
 }
 
 // Rows 1 and 3 break the constraint: the others are done and counted.
@@ -179,19 +137,6 @@ TEST_F(Executing, RowIdOfTheLastChange) {
     EXPECT_EQ(Execute(), 1410);
 }
 
-TEST_F(Executing, ReturningGivesValuesBack) {
-    MustRun("create table t(a number, b varchar2(10))");
-    sb4 numbers[2] = {1, 2};
-    char texts[2][8] = {"", ""};
-    sb2 indicators[2] = {};
-    ASSERT_EQ(Prepare("insert into t values(:a, 'n' || :a) returning b into :b"), 0);
-    EXPECT_EQ(Attribute<ub1>(OCI_ATTR_STMT_IS_RETURNING), 1);
-    MUST(BindName(":a", Int(numbers)) + BindName(":b", Text(texts, indicators)), Execute(2));
-    EXPECT_STREQ(texts[0], "n1");
-    EXPECT_STREQ(texts[1], "n2");
-    EXPECT_EQ(RowCount(), 2u);
-}
-
 // ---- Blocks
 
 TEST_F(Executing, BlockOpensResultSets) {
@@ -253,21 +198,6 @@ TEST_F(Executing, NoticesAreInformation) {
 TEST_F(Executing, ValuesIsAQueryOfOneRow) {
     EXPECT_EQ(One("values( cast( cast('1.50' as decfloat(34)) as varchar(100)))"), OnServer() ? "1.50" : "1.5");
     EXPECT_EQ(One("values(1, 2)"), "1");
-}
-
-TEST_F(Executing, BlockAssignsAndSelectsInto) {
-    sb4 in = 20, out = 0;
-    char text[6] = "";
-    sb2 indicator = 0;
-    ASSERT_EQ(Prepare("begin :out := :in * 2 + 1; select 'name' into :t from dual; null; end;"), 0);
-    ASSERT_EQ(BindName(":IN", Int(in)) + BindName("out", Int(out)) + BindName(":t", Text(text, &indicator)), 0);
-    ASSERT_EQ(Execute(), 0);
-    EXPECT_EQ(out, 41);
-    EXPECT_STREQ(text, "name");
-    ASSERT_EQ(Ready("begin select 1 into :x from dual where 1 = 0; end;", {Int(out)}), 0);
-    EXPECT_EQ(Execute(), 1403);
-    ASSERT_EQ(Ready("begin select a into :x from (select 1 as a union select 2); end;", {Int(out)}), 0);
-    EXPECT_EQ(Execute(), 1422);
 }
 
 }  // namespace

@@ -41,39 +41,6 @@ protected:
     }
 };
 
-TEST_F(PieceByPiece, LongValueComesInSeveral) {
-    Begin("select 'abcdefgh' from dual", {InPieces(SQLT_CHR)});
-    std::string whole;
-    sword rc = OCI_NEED_DATA;
-    for (ub1 asked = OCI_ONE_PIECE; rc == OCI_NEED_DATA && whole.size() < 20; asked = OCI_NEXT_PIECE) {
-        EXPECT_EQ(Fetch(), 3131) << "no buffer was given";
-        Wanted wanted;
-        ASSERT_EQ(Get(wanted), 0);
-        EXPECT_EQ(wanted.piece, asked);
-        char buffer[3];
-        ub4 length = sizeof buffer;
-        EXPECT_EQ(Set(nullptr, &length, asked), 24306);
-        EXPECT_EQ(Set(buffer, nullptr, asked), 24307);
-        EXPECT_EQ(Set(buffer, &length, 7), 24370);
-        whole += Piece(3, rc, asked);
-    }
-    EXPECT_EQ(rc, OCI_SUCCESS);
-    EXPECT_EQ(whole, "abcdefgh");
-}
-
-TEST_F(PieceByPiece, ThatJustFits) {
-    const struct { const char* value; ub2 type; ub4 room; const char* piece; sb4 answer; } cases[] = {
-        {"''", SQLT_STR, 1, "", 0}, {"''", SQLT_STR, 0, "", 24307}, {"'a'", SQLT_STR, 2, "a", 0},
-        {"'a'", SQLT_STR, 1, "#", 24307}, {"''", SQLT_CHR, 0, "", 0}, {"'a'", SQLT_CHR, 1, "a", 0}};
-    for (const auto& c : cases) {
-        if (OnServer() && *c.piece == 0) continue;    // '' is null there
-        Begin(std::string("select ") + c.value + " from dual", {InPieces(c.type)});
-        sword rc = 0;
-        EXPECT_EQ(Piece(c.room, rc), c.piece) << c.value << " in " << c.room;
-        EXPECT_EQ(Answer(rc), c.answer) << c.value << " in " << c.room;
-    }
-}
-
 TEST_F(PieceByPiece, ValueThatHasNoneOfItsType) {
     for (const bool second : {false, true}) {
         ASSERT_EQ(Query(second ? "select '0a', '0ag' from dual" : "select '0ag', '0a' from dual",
@@ -82,15 +49,6 @@ TEST_F(PieceByPiece, ValueThatHasNoneOfItsType) {
         EXPECT_TRUE(!second || Piece(9, rc) == "\x0A");
         EXPECT_EQ(Answer(rc), 1465) << second;
         EXPECT_EQ(Fetch(), 1403) << "the row is given up";
-    }
-}
-
-TEST_F(PieceByPiece, OnlySomeTypes) {
-    for (const ub2 type : {SQLT_INT, SQLT_FLT, SQLT_VNU, SQLT_DAT, SQLT_VCS, SQLT_CUR}) {
-        char area[8];
-        ASSERT_EQ(Prepare("select :1 from dual"), 0);
-        EXPECT_EQ(Define(1, {area, 8, type}, OCI_DYNAMIC_FETCH), 24304) << type;
-        EXPECT_EQ(Bind(1, {area, 8, type}, OCI_DATA_AT_EXEC), 24304) << type;
     }
 }
 
