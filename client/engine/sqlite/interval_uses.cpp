@@ -56,7 +56,10 @@ private:
     [[nodiscard]] std::string_view Before(std::size_t index) const {
         return index > 0 ? At(index - 1) : std::string_view();
     }
-    void Refuse() { status_ = Error(errors::kInconsistentTypes, type_ ? "column " + type_->column.name : "an interval"); }
+    void Refuse() {
+        const bool is_named = type_ && !type_->column.name.empty();    // no cast
+        status_ = Error(errors::kInconsistentTypes, is_named ? "column " + type_->column.name : "an interval");
+    }
 
     // The name or the cast to an interval that begins at a piece; none for aliases and names of tables.
     [[nodiscard]] Span ExpressionAt(std::size_t at) const {
