@@ -32,23 +32,12 @@ TEST(NumberReals, NearestRealOfTheNumber) {
     EXPECT_EQ(real, std::nextafter(1.0f, 2.0f)) << "just above a tie of two floats, though not of two doubles";
 }
 
-TEST(NumberPlainText, Reads) {
-    const std::string long_fraction = "0." + std::string(9000, '0') + "1", long_whole(9000, '7');
-    const struct { std::string_view text; number::Errno error; const char* number; } cases[] = {
-        {"  +1.50 ", 0, "1.5"}, {".5", 0, "0.5"}, {"5.", 0, "5"}, {"-0", 0, "0"}, {"1e3", 0, "1000"},
-        {"1E-3", 0, "0.001"}, {"00012", 0, "12"}, {"0e999999999999", 0, "0"}, {"1e-999999999999", 0, "0"},
-        {long_fraction, 0, "0"}, {"99999999999999999999999999999999999999995", 0, "1E41"}, {"", 1722, ""},
-        {" ", 1722, ""}, {".", 1722, ""}, {"-", 1722, ""}, {"1e", 1722, ""}, {"1e+", 1722, ""}, {"1.2.3", 1722, ""},
-        {"1 2", 1722, ""}, {"--1", 1722, ""}, {"1x", 1722, ""}, {"1,5", 1722, ""}, {"0x10", 1722, ""},
-        {"1e126", 1426, ""}, {"1e999999999999", 1426, ""}, {long_whole, 1426, ""}};
-    for (const auto& c : cases) {
-        OCINumber got{{21, 193, 8}};  // nothing that a row wants
-        ASSERT_EQ(number::FromPlainText(c.text, '.', &got), c.error) << c.text.substr(0, 50);
-        if (!c.error) {
-            EXPECT_EQ(got, Number(c.number)) << c.text.substr(0, 50);
-        }
-    }
+TEST(NumberPlainText, LongTextsAndOtherPoints) {
     OCINumber got;
+    ASSERT_EQ(number::FromPlainText("0." + std::string(9000, '0') + "1", '.', &got), 0);
+    EXPECT_EQ(got, Number("0"));
+    EXPECT_EQ(number::FromPlainText(std::string(9000, '7'), '.', &got), 1426);
+    EXPECT_EQ(number::FromPlainText("", '.', &got), 1722);
     ASSERT_EQ(number::FromPlainText("1,5", ',', &got), 0);
     EXPECT_EQ(got, Number("1.5"));
 }
