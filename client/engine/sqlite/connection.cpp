@@ -354,6 +354,7 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
     broken_ = broken_ || !home_->Unchanged(handle_);
     if (broken_) return Error(errors::kEndOfChannel, "the read-only file has changed").From("SQLITE");
     if (Status status = Settle(); status.Failed()) return status;
+    if (entry.goes_back) lobs_.Forget();
     if (entry.effect == Effect::defines) {
         if (Status status = Commit(); status.Failed()) return status;
     }

@@ -101,6 +101,7 @@ public:
         Effect effect = Effect::reads;
         bool read_only = false;    // by SQLite's word
         bool begins = false;       // a savepoint: it stands in a transaction
+        bool goes_back = false;    // to a savepoint: rows are again what they were
     };
     // Makes way for a statement: ends or begins a transaction, and has the open queries but `query` read ahead.
     Status Enter(const Entry& entry, const SqliteQuery* query, bool& began);

@@ -19,9 +19,9 @@ namespace {
 
 int Length(const Datum& value) { return static_cast<int>(value.length); }
 
-bool IsSavepoint(std::string_view sql) {
+bool BeginsWith(std::string_view sql, std::string_view word) {
     Pieces pieces(sql);
-    return IsWord(pieces.Next(), "savepoint");
+    return IsWord(pieces.Next(), word);
 }
 
 // Whether two more failures can be noted: one, and that there is no room for others.
@@ -46,7 +46,8 @@ SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, 
       as_written_(std::move(compilation.as_written)),
       sql_(sql),
       verb_(VerbOf(sql_)),
-      entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && IsSavepoint(sql)},
+      entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && BeginsWith(sql, "savepoint"),
+             effect == Effect::controls && BeginsWith(sql, "rollback")},
       parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))),
       coercions_(CoercionsOf(compilation.targets, parameters_.size())),
       intervals_(std::move(compilation.targets.intervals)) {}
