@@ -244,23 +244,11 @@ TEST_F(Postgres, CursorsAndNotices) {
 // In the binary form, and in texts where another column has no binary form here.
 TEST_F(Postgres, ValuesAtTheirLimits) {
     const struct { const char* expression; const char* read; } cases[] = {
-        {"'NaN'::numeric", "error 1722"}, {"'infinity'::numeric", "error 1426"}, {"'-infinity'::numeric", "error 1426"},
-        {"-5::numeric", "-5"}, {"1e125::numeric", "decimal 1E+125"}, {"1e126::numeric", "error 1426"},
-        {"1e-140::numeric", "decimal 0"}, {"'infinity'::real", "real inf"}, {"'(70000,4)'::tid", "row 00000000000111700004"},
-        {"'infinity'::timestamp", "error 1841"}, {"'-infinity'::date", "error 1841"}, {"'infinity'::timestamptz", "error 1841"},
-        {"'9999-12-31'::date", "time 9999-12-31 00:00:00"}, {"'10000-01-01'::date", "error 1841"},
-        {"'4713-12-31 BC'::timestamp", "error 1841"}, {"'4712-01-01 BC'::timestamp", "time -4712-01-01 00:00:00"},
+        {"'9999-12-31'::date", "time 9999-12-31 00:00:00"}, {"'4713-12-31 BC'::timestamp", "error 1841"},
+        {"'4712-01-01 BC'::timestamp", "time -4712-01-01 00:00:00"},
         {"'0001-12-31 23:59:59.999999 BC'::timestamp", "time -0001-12-31 23:59:59.999999"},
         {"'0044-03-15 12:00:00+00 BC'::timestamptz", "time -0044-03-15 12:00:00 +00:00"},
-        {"'9999-12-31 23:59:59.999999'::timestamp", "time 9999-12-31 23:59:59.999999"},
-        {"'\\x'::bytea", "null"}, {"'\\x0aff'::bytea", "bytes 0aff"}, {"''::text", "null"}, {"true", "1"}, {"false", "0"},
-        {"'x'::\"char\"", "x"}, {"'n'::name", "n"}, {"(-5)::int2", "-5"}, {"-9223372036854775808", "-9223372036854775808"},
-        {"4294967295::oid", "4294967295"}, {"'[1, 2]'::json", "[1, 2]"}, {"'<a/>'::xml", "<a/>"}, {"1.5::real", "real 1.5"},
-        {"'c'::char(3)", "c  "}, {"'2024-02-29'::date", "time 2024-02-29 00:00:00"}, {"interval '1-2'", "+01-02"},
-        {"interval '-1-2'", "-01-02"}, {"interval '0'", "+00 00:00:00.000000"}, {"interval '4 05:06:07.8'", "+04 05:06:07.800000"},
-        {"interval '-05:06:07.8'", "-00 05:06:07.800000"}, {"interval '106751991 days'", "+106751991 00:00:00.000000"},
-        {"interval '106751992 days'", "error 1873"}, {"interval '-106751992 days'", "error 1873"},
-        {"interval '1 month 1 day'", "error 1867"}};
+        {"'9999-12-31 23:59:59.999999'::timestamp", "time 9999-12-31 23:59:59.999999"}, {"'x'::\"char\"", "x"}};
     for (const auto& c : cases) {
         const std::string read = c.read, select = std::string("select ") + c.expression;
         const bool fails = read.starts_with("error");
@@ -329,26 +317,12 @@ TEST_F(Postgres, ListsWithLargeObjects) {
     }
 }
 
-TEST_F(Postgres, SavepointsAreKnownByTheirNames) {
-    MustCommit("create table t(n integer)");
-    const struct { const char* sql; int number; const char* rows; } cases[] = {
-        {"SAVEPOINT Here", 0, ""}, {"insert into t values(1)", 0, "1;"}, {"/* x */ savepoint \"Here\" ; -- x", 0, "1;"},
-        {"insert into t values(2)", 0, "1;2;"}, {"savepoint a b", 900, "1;2;"}, {"savepoint a; select 1", 933, "1;2;"},
-        {"savepoint \"\"", 900, "1;2;"}, {"Rollback Work To \"Here\"", 0, "1;"}, {"rollback transaction to savepoint HERE", 0, ""},
-        {"rollback to \"Here\"", 1086, ""}, {"savepoint \"a\"\"b\"", 0, ""}, {"insert into t values(3)", 0, "3;"},
-        {"savepoint a$b", 0, "3;"}, {"insert into t values(4)", 0, "3;4;"}, {"rollback to a$B", 0, "3;"},
-        {"release savepoint \"a\"\"b\"", 0, "3;"}, {"rollback to a$b", 1086, "3;"}, {"release here", 0, "3;"},
-        {"rollback to here", 1086, "3;"}};
-    for (const auto& c : cases) {
-        EXPECT_EQ(Run(c.sql), c.number) << c.sql;
-        EXPECT_EQ(Query("select n from t order by n"), c.rows) << c.sql;
-    }
+TEST_F(Postgres, NamesThatAreNoTextAreRefused) {
     engine::ObjectDescription object;
     std::string schema = "\xFF";
     for (const auto kind : {engine::ObjectKind::any, engine::ObjectKind::schema, engine::ObjectKind::database})
         EXPECT_EQ(Answer(connection_->Describe("\xFF", kind, object)), 911);
     EXPECT_EQ(Answer(connection_->UseSchema(schema)), 911);
-    EXPECT_EQ(Query("select n from t"), "3;") << "the transaction goes on";
 }
 
 // What is found at the end undoes the transaction.
