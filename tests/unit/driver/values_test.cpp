@@ -1,8 +1,6 @@
 // Elements as they are stored from a script's texts and as they are shown, for the types that need no library.
 #include <cstring>
-#include <sstream>
 
-#include "core/keywords.h"
 #include "core/state.h"
 #include "objects/buffers.h"
 #include "objects/memory.h"

@@ -15,13 +15,6 @@ protected:
         ASSERT_EQ(Query("select id, name from t order by id",
                         {Int(ids_), Text(names_, indicators_, lengths_, codes_)}, 0, mode), 0);
     }
-    // The numbers of the rows that the last fetch delivered.
-    std::string Delivered() {
-        std::string rows;
-        const ub4 count = RowsFetched();
-        for (ub4 row = 0; row < count; ++row) rows += (row ? "," : "") + std::to_string(ids_[row]);
-        return rows;
-    }
 
     sb4 ids_[10] = {};
     char names_[10][12] = {};

@@ -1,5 +1,4 @@
 // Conversions between the database's values and the application's elements, through binds and defines of one value.
-#include <cmath>
 #include <limits>
 
 #include "support/statement_fixture.h"
@@ -35,21 +34,16 @@ protected:
         return answer == 0 || answer == 24345 ? area : "!" + std::to_string(answer);
     }
     // What the database sees of an element.
-    std::string In(const std::string& area, ub2 type, const std::string& seen_through = "quote(:1)",
-                   ub2* length = nullptr) {
+    std::string In(const std::string& area, ub2 type, const std::string& seen_through = "quote(:1)") {
         std::string copy = area;
         char text[200] = "";
         sb2 indicator = 0;
         sb4 answer = Ready("select " + seen_through + " from dual",
-                           {{copy.data(), static_cast<sb4>(copy.size()), type, nullptr, length}});
+                           {{copy.data(), static_cast<sb4>(copy.size()), type}});
         if (answer == 0) answer = Define(1, Text(text, &indicator));
         if (answer == 0) answer = Execute(1);
         if (answer != 0) return "!" + std::to_string(answer);
         return indicator == -1 ? "-" : text;
-    }
-
-    static std::string Shown(const char* expression, ub2 type, sb4 size) {
-        return std::string(expression) + " as " + std::to_string(type) + " in " + std::to_string(size);
     }
 
     ub2 length_ = 0;
