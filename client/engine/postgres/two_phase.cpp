@@ -97,7 +97,7 @@ Status PgConnection::FinishPrepared(const char* verb, const Xid& xid) {
     if (in_transaction_) return Refused(24776, "a transaction is open");
     Status status = wire_->Run(command.c_str());
     const bool missing = status.Number() == errors::kNoSuchObject;
-    return missing ? Refused(kNoSuchBranch, status.Detail()) : status;
+    return missing ? Refused(kNoSuchBranch) : status;
 }
 
 Status PgConnection::CommitPrepared(const Xid& xid) { return FinishPrepared("commit", xid); }

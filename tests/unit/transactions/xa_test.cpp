@@ -1,4 +1,4 @@
-// The XA switch: each call in each state of a branch, arguments, threads of control, time.
+// The XA switch: arguments, threads of control, time, servers that lose a branch; what transcripts cannot show.
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -61,44 +61,6 @@ constexpr auto kPrepare = &xa_switch_t::xa_prepare_entry;
 constexpr auto kCommit = &xa_switch_t::xa_commit_entry;
 constexpr auto kRollback = &xa_switch_t::xa_rollback_entry;
 constexpr auto kForget = &xa_switch_t::xa_forget_entry;
-
-TEST_F(XaCalls, EachCallInEachState) {
-    enum State { unknown, active, suspended, idle, failed, prepared, kStates };
-    const struct { const char* name; int (*xa_switch_t::*entry)(XID*, int, xa_long); xa_long flags; int codes[kStates]; }
-    calls[] = {
-        // unknown, active, suspended, idle, failed, prepared
-        {"start", kStart, TMNOFLAGS, {XA_OK, XAER_PROTO, XAER_DUPID, XAER_DUPID, XAER_DUPID, XAER_DUPID}},
-        {"join", kStart, TMJOIN, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_RBROLLBACK, XAER_PROTO}},
-        {"resume", kStart, TMRESUME, {XAER_NOTA, XAER_PROTO, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
-        {"end", kEnd, TMSUCCESS, {XAER_NOTA, XA_OK, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
-        {"suspend", kEnd, TMSUSPEND, {XAER_NOTA, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
-        {"fail", kEnd, TMFAIL, {XAER_NOTA, XA_OK, XA_OK, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
-        {"prepare", kPrepare, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_RBROLLBACK, XAER_PROTO}},
-        {"commit", kCommit, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO, XA_OK}},
-        {"one phase", kCommit, TMONEPHASE, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_RBROLLBACK, XAER_PROTO}},
-        {"rollback", kRollback, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XA_OK, XA_OK, XA_OK}},
-        {"forget", kForget, TMNOFLAGS, {XAER_NOTA, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO, XAER_PROTO}},
-    };
-    for (int state = unknown; state < kStates; ++state) {
-        for (const auto& call : calls) {
-            SCOPED_TRACE(std::string(call.name) + " in state " + std::to_string(state));
-            const XID xid = Named(call.name, std::to_string(state));
-            if (state != unknown) {
-                ASSERT_EQ(Call(kStart, xid, TMNOFLAGS), XA_OK);
-                ASSERT_EQ(Change(), 0);
-            }
-            const xa_long ends[] = {0, 0, TMSUSPEND, TMSUCCESS, TMFAIL, TMSUCCESS};
-            if (ends[state] != 0) { EXPECT_EQ(Call(kEnd, xid, ends[state]), XA_OK); }
-            if (state == prepared) { EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS), XA_OK); }
-            EXPECT_EQ(Recovered(), state == prepared);
-            EXPECT_EQ(Call(call.entry, xid, call.flags), call.codes[state]);
-            EXPECT_EQ(Code() == 0, call.codes[state] == XA_OK);
-            (void)Call(kEnd, xid, TMFAIL);    // whatever it is now, it goes
-            (void)Call(kRollback, xid, TMNOFLAGS);
-            EXPECT_EQ(Call(kForget, xid, TMNOFLAGS), XAER_NOTA);
-        }
-    }
-}
 
 // A broken constraint that was deferred ends the branch in one phase and in two.
 TEST_F(XaCalls, WhatWasDeferredIsChecked) {
