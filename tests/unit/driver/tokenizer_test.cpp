@@ -1,4 +1,4 @@
-// The words that a line gives, and what quotes do beyond the line's own end.
+// The words that a line gives.
 #include <cstring>
 #include <vector>
 
@@ -11,11 +11,9 @@ using Words = std::vector<std::string>;
 
 struct Tokenized { Words words; std::string printed; };
 
-// Tokenizes the line in a buffer that holds `left_over` from an earlier line.
-Tokenized Split(const std::string& line, const std::string& left_over = "") {
+Tokenized Split(const std::string& line) {
     static char buffer[kLineSize];
     std::memset(buffer, 0, sizeof buffer);
-    std::memcpy(buffer, left_over.c_str(), left_over.size() + 1);
     std::memcpy(buffer, line.c_str(), line.size() + 1);
     TokenVector tokens;
     int count = 0;
@@ -23,8 +21,6 @@ Tokenized Split(const std::string& line, const std::string& left_over = "") {
     for (int index = 0; index < count; ++index) result.words.push_back(tokens.Words()[index]);
     return result;
 }
-
-const std::string kMissingQuote = "Parser warning: Missing end delimiter \"\"\"\n";
 
 TEST(Tokenizer, SplitsALine) {
     const struct { const char* line; Words words; } cases[] = {
@@ -40,26 +36,6 @@ TEST(Tokenizer, SplitsALine) {
         EXPECT_EQ(result.words, c.words) << c.line;
         EXPECT_EQ(result.printed, "") << c.line;
     }
-}
-
-TEST(Tokenizer, AnOpenQuoteTakesTheRestOfTheLine) {
-    const Tokenized result = Split("a \"b c\n");
-    EXPECT_EQ(result.words, (Words{"a", "b c\n"}));
-    EXPECT_EQ(result.printed, kMissingQuote);
-}
-
-TEST(Tokenizer, AnOpenQuoteIsClosedByWhatAnEarlierLineLeft) {
-    const Tokenized result = Split("a \"b\n", "# 45678 \" c \"d\" e\n");
-    EXPECT_EQ(result.words, (Words{"a", "b\n", "c", "d", "e"}));
-    EXPECT_EQ(result.printed, "");
-}
-
-TEST(Tokenizer, WordsBeyondTheSlotsAreDroppedWithOneWarning) {
-    std::string line;
-    for (int index = 0; index < kTokenSlots + 2; ++index) line += "w ";
-    const Tokenized result = Split(line + "\n");
-    EXPECT_EQ(result.words.size(), size_t{kTokenSlots});
-    EXPECT_EQ(result.printed, "Parser warning: Too many tokens\n");
 }
 
 TEST(Tokenizer, ALineThatFillsTheBuffer) {

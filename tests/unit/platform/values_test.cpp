@@ -21,6 +21,16 @@ namespace {
 
 using namespace std::string_literals;
 
+TEST(PackedDecimal, FromTextTellsWhatIsWrong) {
+    const struct { const char* text; int result; } cases[] = {{"1000", kDecimalOverflow}, {"999.995", kDecimalOverflow},
+        {"", kDecimalBadText}, {"12x", kDecimalBadText}, {nullptr, kDecimalBadText}};
+    for (const auto& c : cases) {
+        unsigned char packed[3] = {1, 2, 3};
+        EXPECT_EQ(TextToDecimal(c.text, packed, 5, 2), c.result) << (c.text ? c.text : "null");
+        EXPECT_EQ(packed[0], 1);
+    }
+}
+
 TEST(PackedDecimal, ToTextOfEveryCapacity) {
     const std::string whole = "-123.45";
     for (std::size_t capacity = 0; capacity < 10; ++capacity) {
