@@ -48,32 +48,6 @@ TEST_F(Blocks, CommitsThatFail) {
     EXPECT_EQ(One("select count(*) from c"), "0");
 }
 
-TEST_F(Blocks, GoBackToSavepoints) {
-    const struct { const char* block; sb4 answer; const char* left; sb4 to_inner; const char* then; } cases[] = {
-        {"begin insert into t values(9); rollback to a; insert into t values(3); insert into t values(3); end;", 1, "1",
-         1086, "1"},
-        {"begin insert into t values(9); savepoint \"b\"; insert into t values(3); rollback to savepoint B; "
-         "insert into t values(3); insert into t values(3); end;", OnServer() ? 1086 : 1, "1,2", 1086, "1,2"},
-        {"begin savepoint b; insert into t values(3); savepoint c; rollback to b; rollback to a; "
-         "insert into t values(5); insert into t values(5); end;", 1, "1", 1086, "1"},
-        {"begin insert into t values(9); savepoint \"A\"; rollback to a; insert into t values(1); end;", 1, "1,2", 1086,
-         "1,2"},
-        {"begin insert into t values(9); savepoint b; insert into t values(10); end;", 0, "1,2,9,10", 0, "1,2,9"},
-        {"begin insert into t values(9); rollback to b; end;", 1086, "1,2", 1086, "1,2"},
-    };
-    for (const auto& c : cases) {
-        for (const char* sql : {"rollback", "delete from t", "commit", "insert into t values(1)", "savepoint a",
-                                "insert into t values(2)"})
-            MustRun(sql);
-        EXPECT_EQ(Run(c.block), c.answer) << c.block;
-        EXPECT_EQ(Rows(), c.left) << c.block;
-        EXPECT_EQ(Run("rollback to b"), c.to_inner) << c.block;
-        EXPECT_EQ(Rows(), c.then) << c.block;
-        EXPECT_EQ(Run("rollback to a"), 0) << c.block;
-        EXPECT_EQ(Rows(), "1") << c.block;
-    }
-}
-
 TEST_F(Blocks, RunOnceForEachRow) {
     sb4 numbers[4] = {1, 2, 3, 3};
     const char* const block = "begin insert into t values(:1); end;";
