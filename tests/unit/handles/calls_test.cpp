@@ -1,6 +1,5 @@
 // The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good
 // arguments, with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
-#include <functional>
 #include <vector>
 
 #include "support/at_once.h"
@@ -131,27 +130,6 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
     EXPECT_EQ(OCIServerVersion(server, err_, nullptr, 0, OCI_HTYPE_SERVER), OCI_ERROR);
 }
 
-// A call whose error handle is good has emptied it, whatever else it is given.
-TEST_F(CallsTest, RecordsOfTheCallBeforeAreGoneWhenTheObjectIsNone) {
-    OCISvcCtx* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    auto* none = reinterpret_cast<dvoid*>(&svc);
-    const std::function<sword()> calls[] = {
-        [&] { return OCIPing(static_cast<OCISvcCtx*>(none), err_, 0); },
-        [&] { return OCIAttrGet(none, OCI_HTYPE_SVCCTX, &svc, nullptr, OCI_ATTR_ENV, err_); },
-        [&] { return OCIAttrGet(svc, OCI_HTYPE_STMT, &none, nullptr, OCI_ATTR_ENV, err_); },
-        [&] { return OCIThreadInit(none, err_); },
-        [&] { return OCISessionEnd(svc, err_, static_cast<OCISession*>(none), 0); },
-        [&] {
-            auto* string = static_cast<OCIString*>(none);
-            return OCIStringResize(env_, err_, 1, &string);
-        }};
-    for (std::size_t call = 0; call < std::size(calls); ++call) {
-        ASSERT_EQ(Answer(OCIPing(svc, err_, 0)), 3114);
-        EXPECT_EQ(calls[call](), OCI_INVALID_HANDLE) << call;
-        EXPECT_EQ(FirstCode(err_), 0) << call;
-    }
-}
-
 // A message beyond what callers have room for is cut to that, and still ends its line.
 TEST_F(CallsTest, LongMessagesEndTheirLine) {
     for (const ub4 mode : {ub4{OCI_DEFAULT}, ub4{OCI_UTF16}}) {
@@ -242,28 +220,6 @@ TEST_F(CallsTest, PasswordsThatAreTooLong) {
                                        OCI_AUTH)), 1017);
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012);
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
-}
-
-TEST_F(CallsTest, VersionsAreCutToTheBuffer) {
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
-    OraText text[200];
-    ASSERT_EQ(Answer(OCIServerVersion(svc, err_, text, sizeof text, OCI_HTYPE_SVCCTX)), 0);
-    const std::string whole = reinterpret_cast<char*>(text);
-    EXPECT_TRUE(whole.starts_with("23.1 KELP embedded engine, SQLite 3.")) << whole;
-    EXPECT_NE(whole.find('\n'), std::string::npos);
-    ASSERT_EQ(Answer(OCIServerVersion(svc, err_, text, 8, OCI_HTYPE_SVCCTX)), 0);
-    EXPECT_EQ(reinterpret_cast<char*>(text), whole.substr(0, 7));
-    EXPECT_EQ(OCIServerVersion(svc, err_, text, 8, OCI_HTYPE_SERVER), OCI_INVALID_HANDLE);
-    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
-    EXPECT_EQ(Answer(OCIServerVersion(server, err_, text, 8, OCI_HTYPE_SERVER)), 3114);
-    ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text(":memory:"), 8, 0)), 0);
-    ASSERT_EQ(Answer(OCIServerVersion(server, err_, text, sizeof text, OCI_HTYPE_SERVER)), 0);
-    EXPECT_EQ(reinterpret_cast<char*>(text), whole);
-    sword major = -1, port = -1;
-    OCIClientVersion(&major, nullptr, nullptr, nullptr, &port);
-    EXPECT_GE(major, 1);
-    EXPECT_EQ(port, 0);
 }
 
 // The application's memory functions, which count what is out.

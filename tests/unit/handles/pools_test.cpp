@@ -1,5 +1,5 @@
-// Pools: who gets which session, what a full pool answers, what ends do, and many threads at once. Refusals that a
-// script shows stand in transcripts/pool_states.
+// Pools: what a full pool answers, what ends do, and many threads at once. Refusals and tags stand in
+// transcripts/pool_states.
 #include <atomic>
 #include <chrono>
 #include <mutex>
@@ -34,12 +34,9 @@ protected:
         if (code == OCI_SUCCESS) name_.assign(reinterpret_cast<char*>(name), length);
         return Answer(code);
     }
-    sb4 Get(OCISvcCtx** svc, OCIError* err, ub4 mode = kSpool, const char* tag = nullptr, OCIAuthInfo* auth = nullptr) {
-        OraText* came = nullptr;
-        ub4 length = 0;
-        const sword code = OCISessionGet(env_, err, svc, auth, Text(name_), static_cast<ub4>(name_.size()), Text(tag),
-                                         Length(tag), &came, &length, &found_, mode);
-        tag_ = came ? std::string(reinterpret_cast<char*>(came), length) : "none";
+    sb4 Get(OCISvcCtx** svc, OCIError* err, ub4 mode = kSpool, OCIAuthInfo* auth = nullptr) {
+        const sword code = OCISessionGet(env_, err, svc, auth, Text(name_), static_cast<ub4>(name_.size()), nullptr, 0,
+                                         nullptr, nullptr, nullptr, mode);
         return code == OCI_SUCCESS_WITH_INFO ? FirstCode(err) : Answer(code, err);
     }
     // For threads.
@@ -47,8 +44,8 @@ protected:
         return Answer(OCISessionGet(env_, err, svc, nullptr, Text(name), static_cast<ub4>(name.size()), nullptr, 0,
                                     nullptr, nullptr, nullptr, kSpool), err);
     }
-    sb4 Release(OCISvcCtx* svc, ub4 mode = OCI_DEFAULT, const char* tag = nullptr) {
-        return Answer(OCISessionRelease(svc, err_, Text(tag), Length(tag), mode));
+    sb4 Release(OCISvcCtx* svc, ub4 mode = OCI_DEFAULT) {
+        return Answer(OCISessionRelease(svc, err_, nullptr, 0, mode));
     }
     sb4 Destroy(ub4 mode = OCI_DEFAULT) { return Answer(OCISessionPoolDestroy(pool_, err_, mode)); }
     ub4 OpenCount() { return Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_OPEN_COUNT); }
@@ -71,39 +68,8 @@ protected:
         return auth;
     }
     OCISPool* pool_ = nullptr;
-    std::string name_, tag_;
-    boolean found_ = FALSE;
+    std::string name_;
 };
-
-TEST_F(Pools, WhichSessionComes) {
-    ASSERT_EQ(Create(0, 3, 1), 0);
-    const auto come_and_go = [&](const char* tag, ub4 mode, const char* retag) {
-        OCISvcCtx* svc = nullptr;
-        EXPECT_EQ(Get(&svc, err_, kSpool | mode, tag), 0);
-        const std::string came = (found_ ? "found " : "") + tag_;
-        EXPECT_EQ(Release(svc, retag ? OCI_SESSRLS_RETAG : OCI_DEFAULT, retag), 0);
-        return came + '/' + std::to_string(OpenCount());
-    };
-    const struct { const char* tag; ub4 mode; const char* retag; const char* came; } cases[] = {
-        {nullptr, 0, "a", "found none/1"}, {"a", 0, nullptr, "found a/1"}, {nullptr, 0, nullptr, "found none/2"},
-        {"a", 0, nullptr, "found a/2"}, {"x", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "none/2"},
-        {"b", 0, "b", "none/2"}, {"b", 0, nullptr, "found b/2"},
-        {"c", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "b/2"}, {"c", 0, "c", "none/3"},
-        // None without a tag is left: the one that rests longest makes room.
-        {"d", 0, "d", "none/3"}, {"a", 0, "", "none/3"}, {"b", OCI_SESSGET_SPOOL_MATCHANY, nullptr, "none/3"},
-        {nullptr, OCI_SESSGET_PURITY_NEW, nullptr, "found none/3"}, {"e", 0, "e", "none/3"},
-        {"e", OCI_SESSGET_PURITY_NEW, "e", "none/3"}};
-    int line = 0;
-    for (const auto& c : cases) EXPECT_EQ(come_and_go(c.tag, c.mode, c.retag), c.came) << line++;
-    auto* wish = New<OCIAuthInfo>(OCI_HTYPE_AUTHINFO);
-    for (ub4 purity : {2u, 1u}) {
-        EXPECT_EQ(Answer(OCIAttrSet(wish, OCI_HTYPE_AUTHINFO, &purity, 0, OCI_ATTR_PURITY, err_)), 0);
-        OCISvcCtx* svc = nullptr;
-        EXPECT_EQ(Get(&svc, err_, kSpool, "e", wish), 0);
-        EXPECT_EQ(found_, purity == 2) << "asked for by the handle: one that somebody had, or nobody";
-        EXPECT_EQ(Release(svc), 0);
-    }
-}
 
 TEST_F(Pools, SessionsOfSeveralUsers) {
     MUST(Create(2, 2, 0, OCI_DEFAULT), Create(2, 2, 0, OCI_SPC_REINITIALIZE));
@@ -111,13 +77,13 @@ TEST_F(Pools, SessionsOfSeveralUsers) {
     OCISvcCtx *svc = nullptr, *other = nullptr;
     ASSERT_EQ(Get(&svc, err_), 0) << "of the pool's own user, who becomes the database's owner";
     ASSERT_EQ(Release(svc), 0);
-    EXPECT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "wrong")), 1017) << "one of hers rests, but not for him";
+    EXPECT_EQ(Get(&svc, err_, kSpool, User(ann_.c_str(), "wrong")), 1017) << "one of hers rests, but not for him";
     MUST(Create(0, 4, 3, OCI_SPC_REINITIALIZE), Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT));
     EXPECT_EQ(OpenCount(), 2u) << "nor for the system's user; steps are for the pool's own";
-    MUST(Create(0, 2, 1, OCI_SPC_REINITIALIZE), Get(&other, err_, kSpool, nullptr, User(ann_.c_str(), "secret")));
+    MUST(Create(0, 2, 1, OCI_SPC_REINITIALIZE), Get(&other, err_, kSpool, User(ann_.c_str(), "secret")));
     EXPECT_EQ(OpenCount(), 2u);
     ASSERT_EQ(Release(svc), 0);
-    ASSERT_EQ(Get(&svc, err_, kSpool, nullptr, User(ann_.c_str(), "secret")), 0) << "the system user's makes room";
+    ASSERT_EQ(Get(&svc, err_, kSpool, User(ann_.c_str(), "secret")), 0) << "the system user's makes room";
     EXPECT_EQ(OpenCount(), 2u);
     EXPECT_EQ(Destroy(OCI_SPD_FORCE), 0);
     EXPECT_EQ(Release(svc), 1012);
