@@ -1,6 +1,8 @@
 // Sign, comparison and the other functions that only look at a number, and the rare cases of packing and unpacking.
 #include "number/number.h"
 
+#include <cstring>
+
 #include "handles/errors.h"
 #include "number/digits.h"
 
@@ -61,7 +63,9 @@ void SetPi(OCINumber* result) noexcept {
 
 Errno Assign(const OCINumber& value, OCINumber* result) noexcept {
     if (!IsValid(value)) return errors::kBadNumber;
-    *result = value;
+    OCINumber assigned{};
+    std::memcpy(assigned.OCINumberPart, value.OCINumberPart, 1U + value.OCINumberPart[0]);
+    *result = assigned;
     return 0;
 }
 
