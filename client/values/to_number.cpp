@@ -106,9 +106,12 @@ int IntegerOfNumber(const Datum& datum, Workspace& workspace, Integer& value) {
     return ToInteger(number, value) != 0 ? errors::kIntegerOverflow : 0;
 }
 
-// What is a whole number but for the engine's binary arithmetic, is one: 4.35 * 100 is 435.
+// What is a whole number but for the engine's binary arithmetic, is one: 4.35 * 100 is 435. What engines compute beyond
+// 64 bits may be rounded to the lower end, which by itself is an integer to them.
 template <class Integer>
 int IntegerOfReal(const Datum& datum, Workspace& workspace, Integer& value) {
+    constexpr double kLowest = -9223372036854775808.0;
+    if (datum.real <= kLowest) return errors::kIntegerOverflow;
     if (std::trunc(datum.real) == datum.real) return IntegerOfBinaryReal(datum, workspace, value);
     return IntegerOfNumber<Integer, NumberOfReal>(datum, workspace, value);
 }
