@@ -99,11 +99,28 @@ std::string WithMoments(std::string name) {
     return name;
 }
 
+// Without the calls that were put around operands of || and around what is cast to integers.
+std::string WithoutCalls(std::string name) {
+    for (const std::string_view call : {"kelp_text(", "kelp_whole("}) {
+        for (std::size_t at; (at = name.find(call)) != std::string::npos;) {
+            Pieces pieces(std::string_view(name).substr(at + call.size()));
+            int depth = 1;
+            for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
+                if (piece == "(") ++depth;
+                if (piece == ")" && --depth == 0) break;
+            }
+            if (depth == 0) name.erase(at + call.size() + pieces.At() - 1, 1);
+            name.erase(at, call.size());
+        }
+    }
+    return name;
+}
+
 // Names that were not quoted are shown in upper case. A name that stands quoted in the statement was.
 std::string ShownName(std::string_view name, std::string_view sql) {
     if (sql.find('"' + std::string(name) + '"') != std::string_view::npos) return std::string(name);
     std::string shown = name.find("kelp_") == std::string_view::npos ? std::string(name)
-                                                                     : WithMoments(AsWritten(name));
+                                                                     : WithMoments(AsWritten(WithoutCalls(std::string(name))));
     char quote = '\0';
     for (char& c : shown) {
         if (quote != '\0') {

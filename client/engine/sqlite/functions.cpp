@@ -52,6 +52,30 @@ void ToNumber(sqlite3_context* context, int count, Arguments arguments) {
     ReturnStored(context, std::move(column), arguments[0]);
 }
 
+// whole(x): what a cast to an integer, of 64 bits, then takes as it is
+void ToWhole(sqlite3_context* context, int, Arguments arguments) {
+    if (sqlite3_value_type(arguments[0]) == SQLITE_INTEGER) return sqlite3_result_value(context, arguments[0]);
+    Column column;
+    ReadDeclaredType("integer", column);
+    OCINumber number;
+    Datum value = ReadDatum(arguments[0], number);
+    Coercion coercion(std::move(column));
+    const Status status = coercion.Apply(value);
+    if (status.Failed()) return Refuse(context, status);
+    const bool fits = value.kind != Kind::decimal || StoredNumber::From(value.Number()).form == StoredNumber::Form::integer;
+    if (!fits) return Refuse(context, errors::kNumericOverflow);
+    ReturnDatum(context, value);
+}
+
+// text(x): a number as it is shown, anything else as it is
+void ToShownText(sqlite3_context* context, int, Arguments arguments) {
+    const bool is_integer = sqlite3_value_type(arguments[0]) == SQLITE_INTEGER;
+    if (is_integer || !IsNumber(arguments[0])) return sqlite3_result_value(context, arguments[0]);
+    const TextArgument shown(arguments[0]);
+    if (shown.Failure() != 0) return Refuse(context, shown.Failure());
+    sqlite3_result_text64(context, shown.Text().data(), shown.Text().size(), SQLITE_TRANSIENT, SQLITE_UTF8);
+}
+
 // decfloat(x), decfloat(x, digits): rounded to 34 or 16 digits
 void ToDecimalFloat(sqlite3_context* context, int count, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_NULL) return sqlite3_result_null(context);
@@ -184,6 +208,8 @@ constexpr FunctionRow kFunctionRows[] = {
     {"empty_clob", 0, 0, SQLITE_DETERMINISTIC, EmptyClob, "clob"},
     {"empty_blob", 0, 0, SQLITE_DETERMINISTIC, EmptyBlob, "blob"},
     {"kelp_number", 1, 3, SQLITE_DETERMINISTIC, ToNumber},
+    {"kelp_whole", 1, 1, SQLITE_DETERMINISTIC, ToWhole},
+    {"kelp_text", 1, 1, SQLITE_DETERMINISTIC, ToShownText},
     {"kelp_decfloat", 1, 2, SQLITE_DETERMINISTIC, ToDecimalFloat},
     {"kelp_binary_float", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBFLOAT>},
     {"kelp_binary_double", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBDOUBLE>},

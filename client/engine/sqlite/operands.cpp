@@ -139,6 +139,16 @@ Span Operands::Before(std::size_t last) const {
     return {begin, last};
 }
 
+Span Operands::OneBefore(std::size_t last) const {
+    std::size_t begin = OperandBegin(last);
+    const auto is_sign = [&](std::size_t at) {
+        const bool signs = At(at) == "+" || At(at) == "-" || At(at) == "~";
+        return signs && (at == 0 || OperandBegin(at) == at);
+    };
+    while (begin < last && begin > 0 && is_sign(begin - 1)) --begin;
+    return {begin, last};
+}
+
 Span Operands::Bare(Span span) const {
     while (span.Size() > 2 && At(span.first) == "(" && Partner(span.first) == span.last - 1) {
         ++span.first;

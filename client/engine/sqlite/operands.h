@@ -23,6 +23,9 @@ public:
     // understood.
     [[nodiscard]] Span From(std::size_t first) const;
     [[nodiscard]] Span Before(std::size_t last) const;
+    // One operand alone, with its signs.
+    [[nodiscard]] Span OneFrom(std::size_t first) const { return {first, OperandEnd(first)}; }
+    [[nodiscard]] Span OneBefore(std::size_t last) const;
 
     // Without the parentheses around the whole of it.
     [[nodiscard]] Span Bare(Span span) const;

@@ -10,6 +10,7 @@
 #include "engine/sqlite/comparisons.h"
 #include "engine/sqlite/interval_uses.h"
 #include "engine/sqlite/names.h"
+#include "engine/sqlite/number_uses.h"
 #include "engine/sqlite/stored_number.h"
 #include "engine/sqlite/table_columns.h"
 #include "number/number.h"
@@ -106,6 +107,7 @@ Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_interv
     Status status = FindAssignments(database, sql, pieces, targets);
     StatementReading reading(database, sql, pieces);
     if (status.Ok()) status = FindComparisons(reading, targets);
+    if (status.Ok()) FindNumberUses(reading, targets);
     const bool uses = has_intervals || sql.find(kSpanPrefix) != sql.npos;
     return status.Ok() && uses ? FindIntervalUses(reading, targets) : status;
 }

@@ -1,0 +1,78 @@
+// One pass over the pieces. A cast stays one, for its result is compared as an integer then.
+#include "engine/sqlite/number_uses.h"
+
+#include <string_view>
+
+#include "engine/sqlite/column_types.h"
+#include "engine/sqlite/names.h"
+#include "engine/sqlite/operands.h"
+#include "oci.h"
+
+namespace engine::sqlite {
+namespace {
+
+class Finder {
+public:
+    Finder(StatementReading& reading, ValueTargets& targets)
+        : sql_(reading.sql), pieces_(reading.pieces), operands_(reading.operands), names_(reading.names), targets_(targets) {}
+
+    void Find() {
+        for (std::size_t at = operands_.FirstExpression(); at < pieces_.size(); ++at) {
+            if (pieces_[at] == "||") Concatenation(at);
+            else if (IsWord(pieces_[at], "cast") && operands_.At(at + 1) == "(") Cast(at + 1);
+        }
+    }
+
+private:
+    // Each operand of a chain once.
+    void Concatenation(std::size_t at) {
+        const Span left = operands_.OneBefore(at);
+        const std::string_view before = left.first > 0 ? operands_.At(left.first - 1) : std::string_view();
+        if (before != "||" && !IsWord(before, "collate")) AsText(left);
+        AsText(operands_.OneFrom(at + 1));
+    }
+
+    void AsText(Span span) {
+        if (span.Size() > 0 && !IsNoNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+    }
+
+    bool IsNoNumber(Span span) {
+        const std::string_view piece = operands_.At(span.first);
+        if (span.Size() == 1 && (piece.back() == '\'' || IsWord(piece, "null"))) return true;
+        const TableColumn* const column = operands_.IsColumn(span) ? names_.Resolve(span) : nullptr;
+        if (!column) return false;
+        const std::uint16_t type = column->column.type;
+        return type == SQLT_CHR || type == SQLT_AFC || IsDateType(type) || IsIntervalType(type);
+    }
+
+    // cast(e as integer), whose parenthesis opens at `open`; integers are told by the digits that they are given.
+    void Cast(std::size_t open) {
+        constexpr std::uint8_t kDigits = 38;
+        const std::size_t close = operands_.Partner(open);
+        std::size_t as = open + 1;
+        while (as < close && !IsWord(operands_.At(as), "as")) as = (operands_.At(as) == "(" ? operands_.Partner(as) : as) + 1;
+        Column column;
+        if (as + 1 >= close || close >= pieces_.size() || !ReadDeclaredType(sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1)), column))
+            return;
+        if (column.type == SQLT_NUM && column.precision == kDigits && column.scale == 0) Wrap({open + 1, as}, "kelp_whole(");
+    }
+
+    void Wrap(Span span, const char* call) {
+        const std::string_view last = pieces_[span.last - 1];
+        targets_.edits.push_back({Begin(span.first), Begin(span.last - 1) + last.size(), call, ")", false});
+    }
+
+    [[nodiscard]] std::size_t Begin(std::size_t index) const { return static_cast<std::size_t>(pieces_[index].data() - sql_.data()); }
+
+    std::string_view sql_;
+    const std::vector<std::string_view>& pieces_;
+    const Operands& operands_;
+    Names& names_;
+    ValueTargets& targets_;
+};
+
+}  // namespace
+
+void FindNumberUses(StatementReading& reading, ValueTargets& targets) { Finder(reading, targets).Find(); }
+
+}  // namespace engine::sqlite
