@@ -72,39 +72,6 @@ TEST(Registry, AreasStayWhereTheyAreUntilTheyAreReleased) {
         for (NamedArea& slot : Areas(kind)) if (slot.in_use) ReleaseArea(slot);
 }
 
-TEST(Registry, TheLowestFreeSlotIsFilledFirst) {
-    NamedObject* first = Register(Kind::svc, "first", &object_a, nullptr);
-    NamedObject* second = Register(Kind::svc, "second", &object_a, nullptr);
-    Release(Kind::svc, "first");
-    EXPECT_EQ(first->object, &object_a) << "release clears the flag only";
-    EXPECT_EQ(Register(Kind::svc, "third", &object_b, &object_a), first);
-    EXPECT_EQ(FindByPointer(Kind::svc, &object_a), second);
-    EXPECT_EQ(first->parent, &object_a);
-    Release(Kind::svc, "second");
-    Release(Kind::svc, "third");
-    EXPECT_EQ(Printed([] { Release(Kind::svc, "third"); }), "Handle third not found\n");
-}
-
-// A slot that is taken anew is as new, but for a key's text: the library may still hold its address.
-TEST(Registry, ATakenSlotKeepsNothingOfTheFormerObject) {
-    auto* const statement = AsRecord<Kind::stmt>(Register(Kind::stmt, "s", &object_a, &object_b));
-    statement->utf16_mode = 16384;
-    Register(Kind::bind, "b", &object_a, &object_b);
-    auto* const key = AsRecord<Kind::key>(Register(Kind::key, "k", &object_a, &object_b));
-    std::strcpy(key->text, "value");
-    for (const Kind kind : {Kind::stmt, Kind::bind, Kind::key}) {
-        const char* const name = kind == Kind::stmt ? "s" : kind == Kind::bind ? "b" : "k";
-        Release(kind, name);
-        NamedObject* const slot = Register(kind, "x", nullptr, nullptr);
-        EXPECT_EQ(slot->object, nullptr) << name;
-        EXPECT_EQ(slot->parent, nullptr) << name;
-        EXPECT_STREQ(slot->name, "x");
-        Release(kind, "x");
-    }
-    EXPECT_EQ(statement->utf16_mode, 0u);
-    EXPECT_STREQ(key->text, "value");
-}
-
 TEST(Registry, NamesAreCutToTheSlot) {
     const std::string long_name(40, 'n');
     const struct { Kind kind; size_t kept; } cases[] = {{Kind::stmt, 31}, {Kind::lob, 31}, {Kind::spool, 35}};
@@ -117,35 +84,6 @@ TEST(Registry, NamesAreCutToTheSlot) {
                   "Handle " + long_name.substr(0, c.kept - 1) + " not found\n");
         Release(c.kind, long_name.c_str());
     }
-}
-
-TEST(Registry, WordsThatStandForAPointer) {
-    Register(Kind::error, "e1", &object_a, nullptr);
-    Register(Kind::stmt, "s1", &object_b, nullptr);
-    Register(Kind::stmt, "e1", &object_b, nullptr);  // names are unique within a kind only
-    const struct { const char* word; void* pointer; const char* printed; } cases[] = {
-        {"e1", &object_a, ""},
-        {"s1", &object_b, ""},  // any kind may supply an error handle
-        {"E1", nullptr, "Handle E1 not found\n"}, {"NULL", nullptr, ""}, {"nulls", nullptr, "Handle nulls not found\n"},
-        {"-1", nullptr, "Handle -1 not found\n"}, {"Invalid", InvalidObject(), ""},
-    };
-    for (const auto& c : cases)
-        EXPECT_EQ(Printed([&] { EXPECT_EQ(ResolveErrorObject(c.word), c.pointer) << c.word; }), c.printed);
-    EXPECT_EQ(ResolveObject(Kind::stmt, "e1"), &object_b);
-    EXPECT_EQ(Printed([] { EXPECT_EQ(ResolveObject(Kind::stmt, "e2"), nullptr); }), "Handle e2 not found\n");
-    EXPECT_STREQ(static_cast<char*>(InvalidObject()), "Invalid buffer");
-    Release(Kind::error, "e1");
-    Release(Kind::stmt, "e1");
-    Release(Kind::stmt, "s1");
-}
-
-TEST(Registry, ReservedWordsAreNoNames) {
-    for (const char* name : {"null", "INVALID"})
-        EXPECT_EQ(Printed([&] { EXPECT_EQ(Register(Kind::lob, name, &object_a, nullptr), nullptr); }),
-                  "Variable name NULL not allowed\n");
-    EXPECT_EQ(OutputName("-1"), nullptr);
-    EXPECT_EQ(OutputName("Null"), nullptr);
-    EXPECT_STREQ(OutputName("invalid"), "invalid");
 }
 
 TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
@@ -171,18 +109,6 @@ TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
     EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "null[1]"); }), "");
     EXPECT_EQ(Printed([] { ResolveObject(Kind::stmt, "s[1]"); }), "Handle s[1] not found\n");
     Release(Kind::lob, "one");
-}
-
-TEST(Registry, KindsOfNumericTypes) {
-    for (int type = -130; type < 100; ++type) {
-        const bool handle = (type >= 1 && type <= 10) || type == 26 || type == 27;
-        const bool descriptor = type == 50 || type == 52 || type == 54 || type == 56 || type == 62;
-        EXPECT_EQ(KindOfHandleType(type).has_value(), handle) << type;
-        EXPECT_EQ(KindOfDescriptorType(type).has_value(), descriptor) << type;
-    }
-    EXPECT_EQ(KindOfHandleType(26), Kind::cpool);
-    EXPECT_EQ(KindOfHandleType(8), Kind::server);
-    EXPECT_EQ(KindOfDescriptorType(62), Kind::datetime);
 }
 
 }  // namespace

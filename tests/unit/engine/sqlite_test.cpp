@@ -20,37 +20,6 @@ namespace fs = std::filesystem;
 
 class Sqlite : public EngineFixture {};
 
-TEST_F(Sqlite, NumbersKeepEveryDigit) {
-    ASSERT_EQ(Run("create table t(n number)"), 0);
-    const struct { const char* text; const char* stored; } cases[] = {
-        {"0", "0"}, {"-1", "-1"}, {"123.45", "real 123.45"}, {"9223372036854775807", "9223372036854775807"},
-        {"-9223372036854775808", "-9223372036854775808"}, {"9223372036854775808", "decimal 9223372036854775808"},
-        {"123456789012345.5", "decimal 123456789012345.5"}, {"12345678901234.5", "real 12345678901234.5"},
-        {"-12345678901234.5", "real -12345678901234.5"}, {"-1234567890123.45", "real -1234567890123.45"},
-        {"-1234567890123456789012345678901234567.8", "decimal -1234567890123456789012345678901234567.8"},
-        {"100000000000000000000", "real 1e+20"}};
-    for (const auto& c : cases) {
-        ASSERT_EQ(Run("delete from t"), 0);
-        const OCINumber number = Number(c.text);
-        ASSERT_EQ(Run("insert into t values(?1)", {Decimal(number)}), 0);
-        EXPECT_EQ(Query("select n from t"), std::string(c.stored) + ';') << c.text;
-        EXPECT_EQ(Query("select count(*) from t where n = ?1", {Decimal(number)}), "1;") << c.text;
-        EXPECT_EQ(Query("select max(n) from t"), std::string(c.stored) + ';') << "without a declaration: " << c.text;
-    }
-    OCINumber none;
-    std::memset(&none, 0xFF, sizeof none);
-    EXPECT_EQ(Run("insert into t(n) values(?1)", {Decimal(none)}), 1722);
-}
-
-TEST_F(Sqlite, ValuesComeBackAsTheirColumnsAreDeclared) {
-    ASSERT_EQ(Run("create table t(c char(4), v varchar2(10), d date, r raw(4), b blob, i integer)"), 0);
-    const date::DateTime noon{.year = 2024, .month = 2, .day = 29, .hour = 12};
-    ASSERT_EQ(Run("insert into t values(?1, ?2, ?3, ?4, ?5, ?6)",
-                  {Text("ab"), Text("ab"), Moment(noon), View(Kind::bytes, "xy"), Null(), Integer(7)}), 0);
-    EXPECT_EQ(Query("select * from t"), "ab  ,ab,time 2024-02-29 12:00:00,bytes 7879,null,7;");
-    EXPECT_EQ(Query("select t.rowid, count(*) from t"), "row 00000000000000000001,1;");
-}
-
 // A statement that is compiled once goes with its tables, whoever makes them anew: what its values are for is what the
 // columns are when it runs.
 TEST_F(Sqlite, StatementsFollowTablesMadeAnew) {

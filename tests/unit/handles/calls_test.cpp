@@ -159,40 +159,6 @@ TEST_F(CallsTest, LongMessagesEndTheirLine) {
     }
 }
 
-TEST_F(CallsTest, Utf16TextsBothWays) {
-    OCIEnv* env = NewEnvironment(OCI_UTF16);
-    OCIError* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
-    const std::u16string database = u"wide";
-    const std::u16string user = u"\u00c4nne\U0001F600";
-    const auto bytes = [](const std::u16string& text) { return static_cast<ub4>(text.size() * 2); };
-    const auto text = [](const std::u16string& t) { return reinterpret_cast<const OraText*>(t.data()); };
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(
-        OCILogon(env, err, &svc, text(user), bytes(user), text(user), bytes(user), text(database), bytes(database)), 0);
-    EXPECT_TRUE(std::filesystem::exists(Folder() + "/wide.db"));
-
-    OCISession* session = nullptr;
-    ASSERT_EQ(OCIAttrGet(svc, OCI_HTYPE_SVCCTX, &session, nullptr, OCI_ATTR_SESSION, err), OCI_SUCCESS);
-    const char16_t* name = nullptr;
-    ub4 size = 0;
-    ASSERT_EQ(OCIAttrGet(session, OCI_HTYPE_SESSION, &name, &size, OCI_ATTR_USERNAME, err), OCI_SUCCESS);
-    EXPECT_EQ(std::u16string(name, size / 2), user);
-
-    EXPECT_EQ(OCILogon(env, err, &svc, text(user), 3, text(user), 4, text(database), bytes(database)), OCI_ERROR);
-    EXPECT_EQ(FirstCode(err), 24501) << "half a unit";
-    EXPECT_EQ(OCILogon(env, err, &svc, text(user), 10, text(user), 4, text(database), bytes(database)), OCI_ERROR);
-    EXPECT_EQ(FirstCode(err), 24501) << "half a pair";
-    char16_t message[100], state[6] = u"-----";
-    ASSERT_EQ(OCIErrorGet(err, 1, reinterpret_cast<OraText*>(state), nullptr, reinterpret_cast<OraText*>(message),
-                          sizeof message, OCI_HTYPE_ERROR), OCI_SUCCESS);
-    EXPECT_EQ(std::u16string(state), u"HY000");
-    EXPECT_EQ(std::u16string(message).substr(0, 24), u"[KELP/CLIENT] ORA-24501:");
-    EXPECT_EQ(OCIErrorGet(err, 1, nullptr, nullptr, reinterpret_cast<OraText*>(message), 31, OCI_HTYPE_ERROR),
-              OCI_ERROR);
-    EXPECT_EQ(std::u16string(message), u"[KELP/CLIENT] ") << "whole units";
-    EXPECT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-}
-
 // Databases by their words; the rest of logons stands in transcripts.
 TEST_F(CallsTest, LogonsFindTheirDatabase) {
     OCISvcCtx* svc = nullptr;

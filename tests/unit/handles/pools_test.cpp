@@ -71,28 +71,6 @@ protected:
     std::string name_;
 };
 
-TEST_F(Pools, SessionsOfSeveralUsers) {
-    MUST(Create(2, 2, 0, OCI_DEFAULT), Create(2, 2, 0, OCI_SPC_REINITIALIZE));
-    EXPECT_EQ(OpenCount(), 0u) << "nobody knows whose";
-    OCISvcCtx *svc = nullptr, *other = nullptr;
-    ASSERT_EQ(Get(&svc, err_), 0) << "of the pool's own user, who becomes the database's owner";
-    ASSERT_EQ(Release(svc), 0);
-    EXPECT_EQ(Get(&svc, err_, kSpool, User(ann_.c_str(), "wrong")), 1017) << "one of hers rests, but not for him";
-    MUST(Create(0, 4, 3, OCI_SPC_REINITIALIZE), Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT));
-    EXPECT_EQ(OpenCount(), 2u) << "nor for the system's user; steps are for the pool's own";
-    MUST(Create(0, 2, 1, OCI_SPC_REINITIALIZE), Get(&other, err_, kSpool, User(ann_.c_str(), "secret")));
-    EXPECT_EQ(OpenCount(), 2u);
-    ASSERT_EQ(Release(svc), 0);
-    ASSERT_EQ(Get(&svc, err_, kSpool, User(ann_.c_str(), "secret")), 0) << "the system user's makes room";
-    EXPECT_EQ(OpenCount(), 2u);
-    EXPECT_EQ(Destroy(OCI_SPD_FORCE), 0);
-    EXPECT_EQ(Release(svc), 1012);
-    EXPECT_EQ(Release(other), 1012) << "all that are in use are taken away";
-    ASSERT_EQ(Create(0, 1, 1, kHomogeneous, "", ""), 0);
-    EXPECT_EQ(Get(&svc, err_, kSpool | OCI_SESSGET_CREDEXT), 0) << "as all of this pool are begun";
-    EXPECT_EQ(Release(svc), 0);
-}
-
 TEST_F(Pools, WhatAFullPoolAnswers) {
     ASSERT_EQ(Create(0, 1, 1), 0);
     OCISvcCtx *svc = nullptr, *second = nullptr;

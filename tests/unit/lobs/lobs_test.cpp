@@ -49,44 +49,6 @@ protected:
     OCILobLocator* other = nullptr;
 };
 
-TEST_F(Lobs, Utf16IsConvertedBothWays) {
-    Temporary(lob);
-    std::string data("a\0\xE4\0\x3D\xD8\x00\xDE", 8);          // a, a-umlaut, and a character of two units
-    ub4 amount = 0;
-    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &amount, 1, data.data(), 8, OCI_ONE_PIECE, nullptr, nullptr, 1000, 0)), 0);
-    EXPECT_EQ(amount, 3u);
-    EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF0\x9F\x98\x80");
-    EXPECT_EQ(Read(lob, 2, 2, 6, 1000) + Read(lob, 3, 1, 8, 1000), "2:" + data.substr(2) + "3:" + data);
-    EXPECT_EQ(Read(lob, 1, 1, 10, 9999), "!24329");
-    const struct { ub4 amount; ub2 set; std::string data; const char* kept; } counted[] = {
-        {2, 1000, data, "2:a\xC3\xA4"}, {2, 1000, data.substr(4) + data, "2:\xF0\x9F\x98\x80" "a"}, {9, 1000, data, "!22921"},
-        {3, 1000, data.substr(0, 5), "2:a\xC3\xA4"}, {2, 31, "\xE4" "bc", "2:\xC3\xA4" "b"}};
-    for (const auto& c : counted) {
-        Temporary(other);
-        const sb4 code = Code(OCILobWrite(svc, err, other, &(amount = c.amount), 1, const_cast<char*>(c.data.data()), Size(c.data),
-                                          OCI_ONE_PIECE, nullptr, nullptr, c.set, 0));
-        EXPECT_EQ(code == 0 ? Read(other) : "!" + std::to_string(code), c.kept);
-    }
-    data = std::string("a\0\xE4\0\xFF\xDB\xFF\xDF", 8);
-    for (const ub2 set : {1000, 2000}) {    // torn within the pair
-        std::string ordered = data;
-        for (std::size_t at = 0; set == 2000 && at < 8; at += 2) std::swap(ordered[at], ordered[at + 1]);
-        for (const ub4 size : {1, 5, 6, 7}) {
-            amount = 0;
-            EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, ordered.data(), size, OCI_FIRST_PIECE, nullptr, nullptr, set,
-                                       0)), OCI_NEED_DATA);
-            EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, ordered.data() + size, 8 - size, OCI_LAST_PIECE, nullptr,
-                                       nullptr, set, 0)), 0);
-            EXPECT_EQ(Read(lob), "3:a\xC3\xA4\xF4\x8F\xBF\xBF") << set << ' ' << size;
-        }
-    }
-    // The second half is missing at the end.
-    EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &(amount = 0), 1, data.data(), 5, OCI_FIRST_PIECE, nullptr, nullptr, 1000, 0)),
-              OCI_NEED_DATA);
-    EXPECT_EQ(Code(OCILobWrite(svc, err, lob, &amount, 1, data.data() + 5, 1, OCI_LAST_PIECE, nullptr, nullptr, 1000, 0)),
-              24812);
-}
-
 TEST_F(Lobs, PiecesGoByRepeatedCalls) {
     Temporary(lob);
     ub4 amount = 6;
@@ -247,29 +209,6 @@ TEST_F(Lobs, ValuesOfTwoRowsAreReadInTurns) {
     for (int round = 0; round < 2; ++round) EXPECT_EQ(Read(lob, 1, 40000) + Read(other, 1, 40000), "1:a1:b");
 }
 
-TEST_F(Lobs, FormsOfEachKind) {
-    OCILobLocator* binary = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
-    Fetch(lob);
-    Fetch(binary, "select b from l for update", SQLT_BLOB);
-    char bytes[4];
-    oraub8 count = 0;    // of characters, which bytes are not counted by
-    EXPECT_EQ(Answer(OCILobRead2(svc, err, binary, nullptr, &count, 1, bytes, 4, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
-    EXPECT_EQ(count, 3u);
-    MustRun("create table n(n nclob)", "insert into n values('x')");
-    Fetch(other, "select n from n", SQLT_DBCLOB);
-    EXPECT_EQ(Answer(OCILobAppend(svc, err, lob, other)), 24806);
-    const struct { OCILobLocator* of; ub1 form; ub2 set; } forms[] = {
-        {lob, SQLCS_IMPLICIT, 873}, {binary, 0, 0}, {other, SQLCS_NCHAR, 2000}};
-    for (const auto& c : forms) {
-        ub1 form = 9;
-        EXPECT_EQ(Answer(OCILobCharSetForm(env, err, c.of, &form)), 0);
-        EXPECT_EQ(form, c.form);
-        ub2 set = 9;
-        EXPECT_EQ(Answer(OCILobCharSetId(env, err, c.of, &set)), 0);
-        EXPECT_EQ(set, c.set);
-    }
-}
-
 TEST_F(Lobs, BindsAndReturningTakeLocators) {
     Temporary(lob);
     MUST(Write(lob, 1, "by bind"), Ready("insert into l(k, b) values(2, :1)", {Locator(lob, SQLT_BLOB)}));
@@ -292,38 +231,6 @@ TEST_F(Lobs, BindsAndReturningTakeLocators) {
     EXPECT_EQ(flag, TRUE);
     SHOULD(Answer(OCILobLocatorAssign(svc, err, lob, &other)), Write(other, 1, "x"));
     EXPECT_EQ(Read(lob, 2) + Read(other, 2), "2:of2:xf");      // a copy of its own
-}
-
-TEST_F(Lobs, BufferedWritesWait) {
-    Fetch(lob);
-    EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_FREE)), 22276);
-    EXPECT_EQ(Answer(OCILobDisableBuffering(svc, err, lob)), 22276);
-    EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, lob)), 0);
-    Fetch(other);
-    EXPECT_EQ(Answer(OCILobEnableBuffering(svc, err, other)), 22277);
-    SHOULD(Write(lob, 1, "H"), Write(lob, 2, "A"));
-    EXPECT_EQ(Read(other, 2), "2:h\xC3\xA4");
-    EXPECT_EQ(Write(other, 1, "x"), 22277);                    // while what is written waits
-    EXPECT_EQ(Answer(OCILobTrim(svc, err, other, 1)), 22277);
-    OCILobLocator* third = NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
-    EXPECT_EQ(Answer(OCILobAssign(env, err, lob, &third)), 22281);
-    ASSERT_EQ(Ready("insert into l(c) values(:1)", {Locator(lob)}), 0);
-    EXPECT_EQ(Execute(), 22281);
-    EXPECT_EQ(Read(lob, 3), "3:HAl");                          // which has it written
-    EXPECT_EQ(Answer(OCILobAssign(env, err, lob, &third)), 0);
-    ub4 amount = 0;
-    EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &amount)), 22279);
-    EXPECT_EQ(Read(lob, 10, 1, 4), "!24808");
-    EXPECT_EQ(Write(lob, 1, "x", OCI_FIRST_PIECE), 24808);
-    std::string taken;
-    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &amount, 1, nullptr, 0, &taken, Takes, 0, 0)), 24808);
-    EXPECT_EQ(Write(lob, 20, "x"), 22282);
-    EXPECT_EQ(Write(lob, 1, std::string(600000, 'x')), 22280);
-    EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, 9)), 24801);
-    EXPECT_EQ(Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_FREE)), 0);
-    SHOULD(Write(lob, 3, "B"), Answer(OCILobFlushBuffer(svc, err, lob, OCI_LOB_BUFFER_NOFREE)), Write(lob, 1, "J"));
-    EXPECT_EQ(Answer(OCILobDisableBuffering(svc, err, lob)), 0);
-    EXPECT_EQ(Stored(), "JABlo world");
 }
 
 // What one locator knows of the places of characters is nothing once another has written.

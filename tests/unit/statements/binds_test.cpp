@@ -6,32 +6,6 @@ namespace {
 
 class Binds : public StatementTest {};
 
-TEST_F(Binds, ByNameAndByPosition) {
-    sb4 one = 1, two = 2, three = 3, result = 0;
-    const auto run = [&] {
-        EXPECT_EQ(Define(1, Int(result)), 0);
-        const sb4 answer = Execute(1);
-        return answer == 0 ? result : -answer;
-    };
-    MUST(Prepare("select :a * 100 + :b * 10 + :a from dual"), BindName("a", Int(one)));
-    EXPECT_EQ(run(), -1008);
-    ASSERT_EQ(BindName(":B", Int(two)), 0);
-    EXPECT_EQ(run(), 121) << "one bind by name serves both places";
-    ASSERT_EQ(Bind(3, Int(three)), 0);
-    EXPECT_EQ(run(), 123) << "a bind by position serves one";
-    for (const char* name : {"c", ""}) EXPECT_EQ(BindName(name, Int(one)), 1036) << name;
-    for (const ub4 position : {0u, 4u}) EXPECT_EQ(Bind(position, Int(one)), 1036) << position;
-    EXPECT_EQ(Bind(1, Int(one), 0x1000), 24300);
-    EXPECT_EQ(Define(0, Int(one)), 24308);
-    EXPECT_EQ(Define(1, Int(one), 0x1000), 24300);
-    EXPECT_EQ(Define(1, {nullptr, 4, SQLT_INT}), 21560);
-
-    ASSERT_EQ(Ready("begin :r := :a * 10 + :b + :a; end;", {Int(result), Int(one), Int(two)}), 0)
-        << "in a block each name has one position";
-    ASSERT_EQ(Execute(), 0);
-    EXPECT_EQ(result, 13);
-}
-
 TEST_F(Binds, NewTextLetsThemGo) {
     sb4 value = 5;
     OCIBind* bind = nullptr;

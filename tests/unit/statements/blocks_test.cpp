@@ -17,54 +17,12 @@ protected:
     }
 };
 
-// A block that fails undoes what it did since it last ended the transaction, and not what was before it.
-TEST_F(Blocks, ThatFail) {
-    const struct { const char* block; sb4 answer; const char* left; const char* after_rollback; } cases[] = {
-        {"begin insert into t values(2); insert into t values(1); end;", 1, "1,9", "1"},
-        {"begin insert into t values(2); insert into t values(1); commit; end;", 1, "1,9", "1"},
-        {"begin insert into t values(2); commit; insert into t values(3); insert into t values(1); end;", 1, "1,2,9",
-         "1,2,9"},
-        {"begin insert into t values(2); rollback; insert into t values(3); insert into t values(1); end;", 1, "1",
-         "1"},
-        {"begin insert into t values(2); commit; insert into t values(3); commit; insert into t values(4); "
-         "insert into t values(1); end;", 1, "1,2,3,9", "1,2,3,9"},
-        {"begin insert into t values(2); commit; insert into t values(3); end;", 0, "1,2,3,9", "1,2,9"},
-        {"begin insert into t values(2); select a into :x from t where a = 7; end;", 1008, "1,9", "1"},
-    };
-    for (const auto& c : cases) {
-        MustRun("delete from t", "insert into t values(1)", "commit", "insert into t values(9)");
-        EXPECT_EQ(Run(c.block), c.answer) << c.block;
-        EXPECT_EQ(Rows(), c.left) << c.block;
-        MustRun("rollback");
-        EXPECT_EQ(Rows(), c.after_rollback) << c.block;
-    }
-}
-
 // Savepoints of the application: one from before the block takes the block's own mark with it when the block goes back
 // to it, and what follows is undone all the same; one set in the block is there after it.
 TEST_F(Blocks, CommitsThatFail) {
     MustRun("create table c(id integer references t deferrable initially deferred)", "commit");
     EXPECT_EQ(Run("begin insert into c values(77); commit; insert into c values(88); end;"), 2091);
     EXPECT_EQ(One("select count(*) from c"), "0");
-}
-
-TEST_F(Blocks, RunOnceForEachRow) {
-    sb4 numbers[4] = {1, 2, 3, 3};
-    const char* const block = "begin insert into t values(:1); end;";
-    ASSERT_EQ(Ready(block, {Int(numbers)}), 0);
-    EXPECT_EQ(Execute(4), 1);
-    EXPECT_EQ(Rows(), "") << "all iterations are one block";
-    for (const ub4 rows : {3u, 2u}) {
-        MustRun("delete from t");
-        MUST(Ready(block, {Int(numbers)}), Execute(rows));
-        EXPECT_EQ(RowCount(), rows);
-    }
-    numbers[0] = 5;
-    ASSERT_EQ(Execute(1), 0);
-    EXPECT_EQ(RowCount(), 1u) << "the former execute's rows are not counted again";
-    MustRun("delete from t");
-    MUST(Ready(block, {Int(numbers)}), Execute(3, OCI_DEFAULT, 1));
-    EXPECT_EQ(Rows(), "2,3") << "from the row offset on";
 }
 
 // Counts of elements around the room there is, in and out.

@@ -54,28 +54,6 @@ TEST_F(Executing, RowsThatFail) {
     EXPECT_EQ(BatchErrors(), "1 in 1, 1 in 3, ");
 }
 
-// What an error handle tells of rows is that of the last execute through it.
-TEST_F(Executing, RowsThatFailAreForgotten) {
-    MustRun("create table t(a number primary key)");
-    sb4 numbers[4] = {1, 1, 2, 1};
-    const struct { ub4 iterations; sb4 answer; const char* failed; } cases[] = {
-        {4, 24381, "1 in 1, 1 in 3, "}, {3, 24381, "1 in 1, "}, {1, 0, ""}};
-    for (const auto& c : cases) {
-        MustRun("delete from t");
-        ASSERT_EQ(Ready("insert into t values(:1)", {Int(numbers)}), 0);
-        EXPECT_EQ(Execute(c.iterations, OCI_BATCH_ERRORS), c.answer);
-        EXPECT_EQ(BatchErrors(), c.failed);
-    }
-    MustRun("delete from t");
-    ASSERT_EQ(Ready("insert into t values(:1)", {Int(numbers)}), 0);
-    EXPECT_EQ(Execute(2), 1);
-    EXPECT_EQ(FailedRow(), 1u);
-    EXPECT_EQ(RowCount(), 1u);
-    EXPECT_EQ(Rows(), "1") << "without batch errors the first ends it";
-    MustRun("delete from t");
-    EXPECT_EQ(FailedRow(), 0u);
-}
-
 TEST_F(Executing, ValueThatCannotBeReadFailsItsRow) {
     MustRun("create table t(a number)");
     char areas[3][4] = {{'1', 0, 0, 0}, {'1', '2', '3', '4'}, {'5', 0, 0, 0}};
@@ -138,38 +116,6 @@ TEST_F(Executing, RowIdOfTheLastChange) {
 }
 
 // ---- Blocks
-
-TEST_F(Executing, BlockOpensResultSets) {
-    MustRun("create table t(a number)", "insert into t values(5)");
-    for (const bool descriptor : {true, false}) {
-        OCIStmt* element = descriptor ? reinterpret_cast<OCIStmt*>(NewDescriptor<OCIResult>(OCI_DTYPE_RSET)) : nullptr;
-        OCIResult* const result = reinterpret_cast<OCIResult*>(element);
-        EXPECT_EQ(descriptor ? Answer(OCIResultSetToStmt(result, err)) : 24336, 24336) << "nothing was opened yet";
-        ASSERT_EQ(Prepare("begin open :c for select a, :x from t; end;"), 0);
-        sb4 x = 77;
-        ASSERT_EQ(BindName("c", {&element, 8, static_cast<ub2>(descriptor ? SQLT_RSET : SQLT_CUR)}), 0);
-        MUST(BindName("x", Int(x)), Execute());
-        ASSERT_NE(element, nullptr);
-        ASSERT_EQ(Answer(OCIResultSetToStmt(reinterpret_cast<OCIResult*>(element), err)), 0);
-        OCIStmt* const block = std::exchange(stmt, element);
-        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_STMT_TYPE), OCI_STMT_SELECT);
-        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_PARAM_COUNT), 2u);
-        const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, svc, OCI_HTYPE_SVCCTX);
-        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), 1u);
-        sb4 values[2] = {};
-        MUST(Define(1, Int(values[0])) + Define(2, Int(values[1])), Fetch());
-        EXPECT_EQ(values[0], 5);
-        EXPECT_EQ(values[1], 77);
-        EXPECT_EQ(Fetch(), 1403);
-        EXPECT_EQ(OCIHandleFree(stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
-        stmt = block;
-    }
-    for (void* wrong : {static_cast<void*>(this), static_cast<void*>(env), static_cast<void*>(stmt)}) {
-        ASSERT_EQ(Prepare("begin open :c for select a from t; end;"), 0);
-        MUST(BindName("c", {&wrong, 8, SQLT_CUR}));
-        EXPECT_EQ(Execute(), 24336) << "neither null nor another statement";
-    }
-}
 
 // What the server says besides comes with a success, in its order; behind a truncation, which is told first.
 TEST_F(Executing, NoticesAreInformation) {

@@ -41,17 +41,6 @@ protected:
     }
 };
 
-TEST_F(PieceByPiece, ValueThatHasNoneOfItsType) {
-    for (const bool second : {false, true}) {
-        ASSERT_EQ(Query(second ? "select '0a', '0ag' from dual" : "select '0ag', '0a' from dual",
-                        {InPieces(SQLT_BIN), InPieces(SQLT_BIN)}, 0), 0);
-        sword rc = FetchCode();
-        EXPECT_TRUE(!second || Piece(9, rc) == "\x0A");
-        EXPECT_EQ(Answer(rc), 1465) << second;
-        EXPECT_EQ(Fetch(), 1403) << "the row is given up";
-    }
-}
-
 TEST_F(PieceByPiece, ExecuteAsksForEachValueOfEachRow) {
     MustRun("create table u(a number, b varchar2(100), c raw(10))");
     sb4 numbers[2] = {1, 2};
@@ -79,22 +68,6 @@ TEST_F(PieceByPiece, ExecuteAsksForEachValueOfEachRow) {
     EXPECT_EQ(RowCount(), 2u);
     EXPECT_EQ(One("select group_concat(a || ':' || coalesce(b, '-') || ':' || hex(c), '/') from u"),
               "1:first and last:0102/2:-:03");
-}
-
-TEST_F(PieceByPiece, NothingIsWanted) {
-    sb4 number = 0;
-    ub4 length = 1;
-    char buffer[1];
-    OCIDefine* define = nullptr;
-    ASSERT_EQ(Query("select 1 from dual", {Int(number)}, 0), 0);
-    Wanted wanted;
-    EXPECT_EQ(Get(wanted), 24370);
-    ASSERT_EQ(Define(&define, 1, Int(number)), 0);
-    const auto set = [&](ub4 type) {
-        return OCIStmtSetPieceInfo(define, type, err, buffer, &length, 0, nullptr, nullptr);
-    };
-    EXPECT_EQ(Answer(set(OCI_HTYPE_DEFINE)), 24370);
-    for (const ub4 type : {OCI_HTYPE_BIND, 99}) EXPECT_EQ(set(type), OCI_INVALID_HANDLE) << type;
 }
 
 // Other statements of the session insert, select and commit while a row waits for its next piece: its bytes stay.
@@ -199,28 +172,6 @@ TEST_F(PieceByPiece, ANullWithoutAnyIndicator) {
     sword rc = 0;
     EXPECT_EQ(Piece(10, rc), "");
     EXPECT_EQ(Answer(rc), 1405);
-}
-
-// A buffer that takes no character is refused with 24307, and the value stays whole for the next.
-TEST_F(PieceByPiece, BuffersThatAreTooSmall) {
-    const struct { const char* value; ub2 type; ub4 too_small; ub4 enough; const char* first; } cases[] = {
-        {"\xc3\xa4z", SQLT_CHR, 1, 2, "\xc3\xa4"}, {"\xe2\x82\xacz", SQLT_CHR, 2, 3, "\xe2\x82\xac"},
-        {"a\xe2\x82\xacz", SQLT_CHR, 0, 3, "a"}, {"az", SQLT_STR, 0, 2, "a"}, {"az", SQLT_STR, 1, 2, "a"},
-        {"\xc3\xa4z", SQLT_STR, 2, 3, "\xc3\xa4"}};
-    for (const auto& c : cases) {
-        Begin("select '" + std::string(c.value) + "' from dual", {InPieces(c.type)});
-        char buffer[8] = "";
-        ub4 length = c.too_small;
-        sb2 indicator = 0;
-        ASSERT_EQ(Set(buffer, &length, OCI_NEXT_PIECE, &indicator), 0);
-        EXPECT_EQ(Fetch(), 24307) << c.value << " in " << c.too_small;
-        EXPECT_EQ(Fetch(), 3131) << "and a buffer is wanted still";
-        sword rc = 0;
-        EXPECT_EQ(Piece(c.enough, rc), c.first) << c.value << " in " << c.enough;
-        ASSERT_EQ(rc, OCI_NEED_DATA) << c.value;
-        EXPECT_EQ(Piece(8, rc), c.value + std::strlen(c.first));
-        EXPECT_EQ(rc, OCI_SUCCESS);
-    }
 }
 
 // The null of one row is not that of the next; text of a terminated type ends at its zero, other text does not.

@@ -50,41 +50,6 @@ protected:
     sb2 indicator_ = 0;
 };
 
-TEST_F(Conversions, OtherNumbers) {
-    EXPECT_EQ(Out("'0.1'", SQLT_FLT, 8), Raw(0.1));
-    EXPECT_EQ(Out("0.1", SQLT_FLT, 4), Raw(0.1f));
-    EXPECT_EQ(Out("1e39", SQLT_FLT, 4), "!1426");
-    EXPECT_EQ(Out("9e999", SQLT_FLT, 4), OnServer() ? "!1426" : Raw(std::numeric_limits<float>::infinity()));
-    EXPECT_EQ(Out("3", SQLT_IBDOUBLE, 8), Raw(3.0));
-    EXPECT_EQ(Out("0.1 + 0.2", SQLT_FLT, 8), Raw(OnServer() ? 0.3 : 0.1 + 0.2)) << "as the engine has it";
-    EXPECT_EQ(Out("0.1 + 0.2", SQLT_NUM, 22), Out("'0.3'", SQLT_NUM, 22));
-    for (const ub2 type : {SQLT_NUM, SQLT_VNU}) {
-        EXPECT_EQ(Hex(Out("123.45", type, 22).substr(0, 5)), "04C202182E") << type;
-        EXPECT_EQ(Hex(Out("'-1'", type, 22).substr(0, 4)), "033E6466") << type;
-        EXPECT_EQ(Out("'x'", type, 22), "!1722") << type;
-    }
-    EXPECT_EQ(length_, 0);
-    EXPECT_EQ(Hex(Out("-12345", SQLT_PDN, 3)), "12345D");
-    EXPECT_EQ(Hex(Out("7", SQLT_PDN, 3)), "00007C");
-    EXPECT_EQ(length_, 3);
-    EXPECT_EQ(Out("'1e60'", SQLT_PDN, 8), "!1457");
-    EXPECT_EQ(Out("123456", SQLT_PDN, 3), "!1457");
-    // In an area of their size, codes 21 and 22 are the machine's float and double.
-    EXPECT_EQ(Out("0.1", SQLT_BFLOAT, 4), Raw(0.1f));
-    EXPECT_EQ(Out("0.1", SQLT_BDOUBLE, 8), Raw(0.1));
-    EXPECT_EQ(Out("1e39", SQLT_BFLOAT, 4), "!1426");
-    EXPECT_EQ(In(Raw(0.1f), SQLT_BFLOAT, "cast(:1 as varchar(40))"), In(Raw(0.1f), SQLT_FLT, "cast(:1 as varchar(40))"));
-    EXPECT_EQ(In(Raw(-2.5), SQLT_BDOUBLE, "quote(:1)"), "-2.5");
-    // Decimal floats come back through the same types and are shown by the cast that displays them.
-    const std::string googol = OnServer() ? "1" + std::string(100, '0') : "1E+100";
-    for (const std::string& number : {std::string("0"), std::string("1.5"), std::string("-123456789.012345"), googol}) {
-        const std::string wide = Out("'" + number + "'", SQLT_BDOUBLE, 16);
-        const std::string narrow = Out("'" + number + "'", SQLT_BFLOAT, 8);
-        EXPECT_EQ(In(wide, SQLT_BDOUBLE, "cast(cast(:1 as decfloat(34)) as varchar(200))"), number);
-        EXPECT_EQ(In(narrow, SQLT_BFLOAT, "cast(cast(:1 as decfloat(34)) as varchar(200))"), number);
-    }
-}
-
 TEST_F(Conversions, Dates) {
     MustRun("create table d(d date, s timestamp, v varchar2(30), z timestamp with time zone)",
             "insert into d values(date '2024-02-29', timestamp '2024-02-29 13:05:00.25', '29-FEB-24', "
