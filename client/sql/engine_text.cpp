@@ -230,6 +230,17 @@ private:
         return found == dialect_.casts.end() ? nullptr : &*found;
     }
 
+    // The sign of a scale, as in number(5, -2).
+    bool IsSign(std::size_t index) const {
+        return (tokens_[index].Is("-") || tokens_[index].Is("+")) && Previous(index).Is(",");
+    }
+
+    // What no type has among its sizes.
+    static bool IsStray(const Token& token) {
+        return token.kind != TokenKind::word && token.kind != TokenKind::number && !token.Is("(") && !token.Is(")") &&
+               !token.Is(",") && !token.Is("*");
+    }
+
     // "as T(a, b)" of a cast that became a function: its further arguments. Answers the closing parenthesis.
     std::size_t VisitCastType(std::size_t as) {
         std::string arguments;
@@ -243,8 +254,10 @@ private:
         for (; tokens_[index].kind != TokenKind::end; ++index) {
             const Token& token = tokens_[index];
             if (token.Is(")") && --depth < 0) break;
-            if (token.kind == TokenKind::number) arguments.append(", ").append(token.text);
+            if (token.kind == TokenKind::number) arguments.append(IsSign(index - 1) ? "" : ", ").append(token.text);
             if (token.Is("*")) arguments.append(", 38");
+            if (IsSign(index)) arguments.append(", ").append(token.text);
+            else if (IsStray(token)) arguments.append(token.text);    // the engine refuses it there
             if (token.Is("(")) ++depth;
         }
         Replace(tokens_[as], tokens_[index].begin, arguments);
