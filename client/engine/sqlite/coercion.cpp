@@ -13,6 +13,7 @@
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/interval_text.h"
+#include "engine/sqlite/stored_number.h"
 #include "handles/errors.h"
 #include "number/number.h"
 #include "platform/hexadecimal.h"
@@ -94,7 +95,8 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
 }  // namespace
 
 // Without limits nothing is refused for its size.
-Coercion::Coercion(Column column, Purpose purpose) : column_(std::move(column)), purpose_(purpose) {
+Coercion::Coercion(Column column, Purpose purpose)
+    : column_(std::move(column)), purpose_(purpose), among_reals_(HasBinaryDigits(column_)) {
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) column_.scale = kFloating;
     const bool is_large = column_.type == SQLT_CLOB || column_.type == SQLT_DBCLOB || column_.type == SQLT_BLOB;
     if (is_large) column_.size = column_.characters = 0;    // which are a locator's
@@ -124,7 +126,11 @@ bool Coercion::Concerns(const Column& column) {
 Status Coercion::Apply(Datum& value) {
     if (value.kind == Kind::null) return {};
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) return ApplyBinary(value);
-    if (IsNumberType(column_.type)) return ApplyNumber(value);
+    if (IsNumberType(column_.type)) {
+        Status status = ApplyNumber(value);
+        if (status.Ok() && among_reals_) KeepAmongReals(value);
+        return status;
+    }
     if (IsDateType(column_.type)) return ApplyDate(value);
     if (IsIntervalType(column_.type)) return ApplyInterval(value);
     if (column_.type == SQLT_BIN || column_.type == SQLT_LBI || column_.type == SQLT_BLOB) return ApplyBytes(value);
@@ -167,6 +173,29 @@ Status Coercion::ApplyDigits(Datum& value) {
     if (!limited || IsPlainReal(value.real, precision, scale)) return {};
     const int failure = number::FromReal15(value.real, &number_);
     return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
+}
+
+// SQLite makes reals of the integers in a column of binary digits: those that none holds are kept as blobs. A real that
+// was computed has the digits that count.
+void Coercion::KeepAmongReals(Datum& value) {
+    if (value.kind == Kind::real && IsWholeReal(value.real)) {
+        (void)number::FromReal15(value.real, &number_);
+        (void)number::ToDouble(number_, &value.real);
+        return;
+    }
+    if (value.kind == Kind::decimal) {
+        const StoredNumber stored = StoredNumber::From(value.Number());
+        if (stored.form != StoredNumber::Form::integer) return;
+        value.kind = Kind::integer;
+        value.integer = stored.integer;
+    }
+    if (value.kind != Kind::integer) return;
+    const auto real = static_cast<double>(value.integer);
+    if (IsWholeReal(real) && static_cast<std::int64_t>(real) == value.integer) return;
+    number::FromInt64(value.integer, &number_);
+    const StoredNumber stored = StoredNumber::Blob(number_);
+    text_.assign(reinterpret_cast<const char*>(stored.blob), stored.length);
+    Set(value, Kind::bytes, text_.data(), text_.size());
 }
 
 // A real of the column's width, whatever came as a number.

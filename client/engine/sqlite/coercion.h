@@ -30,6 +30,7 @@ private:
     Status ApplyNumber(Datum& value);
     Status ApplyBinary(Datum& value);
     Status ApplyDigits(Datum& value);
+    void KeepAmongReals(Datum& value);
     Status ApplyDecimal(const OCINumber& number, Datum& value);
     Status ApplyText(Datum& value);
     Status WriteNumber(Datum& value);
@@ -43,6 +44,7 @@ private:
 
     Column column_;
     Purpose purpose_;
+    bool among_reals_;
     OCINumber number_{};
     DateText date_{};
     std::string text_;

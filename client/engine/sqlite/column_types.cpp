@@ -203,6 +203,10 @@ bool IsNumberType(std::uint16_t type) {
     return type == SQLT_NUM || type == SQLT_BFLOAT || type == SQLT_BDOUBLE;
 }
 
+bool HasBinaryDigits(const Column& column) {
+    return column.type == SQLT_NUM && column.scale == kFloating && column.precision != 0;
+}
+
 bool IsDateType(std::uint16_t type) {
     return type == SQLT_DAT || type == SQLT_TIMESTAMP || type == SQLT_TIMESTAMP_TZ || type == SQLT_TIMESTAMP_LTZ;
 }

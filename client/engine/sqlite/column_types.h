@@ -16,6 +16,8 @@ bool ReadDeclaredType(std::string_view declared, Column& column);
 // Whether values of the type are numbers; whether they are dates and times, kept as text.
 bool IsNumberType(std::uint16_t type);
 bool IsDateType(std::uint16_t type);
+// Of binary digits: float, real, double precision.
+bool HasBinaryDigits(const Column& column);
 // Intervals are kept as integers: months, or nanoseconds.
 bool IsIntervalType(std::uint16_t type);
 

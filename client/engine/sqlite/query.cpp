@@ -122,6 +122,7 @@ void SqliteQuery::DescribeIntervals() {
 }
 
 SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
+    if (HasBinaryDigits(column)) return Reading::binary_digits;
     if (IsNumberType(column.type)) return Reading::number;
     if (IsDateType(column.type)) return Reading::date;
     if (IsIntervalType(column.type)) return Reading::interval;

@@ -47,7 +47,7 @@ private:
         drained      // the rows to come are in store_, with end_ behind them
     };
     // How a value of a column is handed out.
-    enum class Reading : std::uint8_t { as_stored, number, padded, date, row_id, bytes, characters, lob, interval };
+    enum class Reading : std::uint8_t { as_stored, number, binary_digits, padded, date, row_id, bytes, characters, lob, interval };
     // Room for a column's value that SQLite keeps in another form.
     struct Room {
         OCINumber number;
@@ -81,6 +81,7 @@ private:
     void Drain(Status end) noexcept;
 
     void Fill();
+    static void FillWhole(Datum& value);
     void FillRowId(int column, Datum& value);
     void FillDate(int column, Datum& value);
     void FillNumber(int column, Datum& value);

@@ -217,6 +217,7 @@ void SqliteQuery::Fill() {
             case SQLITE_FLOAT:
                 value->kind = Kind::real;
                 value->real = sqlite3_value_double(stored);
+                if (*reading == Reading::binary_digits) FillWhole(*value);
                 break;
             case SQLITE_TEXT:
                 value->kind = Kind::text;
@@ -238,6 +239,13 @@ void SqliteQuery::Fill() {
             default: *value = {}; break;
         }
     }
+}
+
+// A whole number has all the digits of its real, not those alone that a number has which was computed.
+void SqliteQuery::FillWhole(Datum& value) {
+    if (!IsWholeReal(value.real)) return;
+    value.kind = Kind::integer;
+    value.integer = static_cast<std::int64_t>(value.real);
 }
 
 void SqliteQuery::FillRowId(int column, Datum& value) {

@@ -34,12 +34,18 @@ StoredNumber StoredNumber::From(const OCINumber& number) {
     } else if (SignificantDigits(number) <= number::kRealDigits && number::ToDouble(number, &stored.real) == 0) {
         stored.form = Form::real;
     } else {
-        stored.form = Form::blob;
-        const std::size_t count = number.OCINumberPart[0];
-        std::memcpy(stored.blob, kMark, sizeof kMark);
-        std::memcpy(stored.blob + sizeof kMark, number.OCINumberPart + 1, count);
-        stored.length = static_cast<std::uint8_t>(sizeof kMark + count);
+        return Blob(number);
     }
+    return stored;
+}
+
+StoredNumber StoredNumber::Blob(const OCINumber& number) {
+    StoredNumber stored;
+    stored.form = Form::blob;
+    const std::size_t count = number.OCINumberPart[0];
+    std::memcpy(stored.blob, kMark, sizeof kMark);
+    std::memcpy(stored.blob + sizeof kMark, number.OCINumberPart + 1, count);
+    stored.length = static_cast<std::uint8_t>(sizeof kMark + count);
     return stored;
 }
 

@@ -23,7 +23,14 @@ struct StoredNumber {
     unsigned char blob[4 + OCI_NUMBER_SIZE];
 
     static StoredNumber From(const OCINumber& number);
+    static StoredNumber Blob(const OCINumber& number);    // in that form, whatever it is
 };
+
+// A column of binary digits (float, real, double precision) has a whole number in 64 bits as a real, where one holds it.
+inline bool IsWholeReal(double value) {
+    constexpr double kEnd = 9223372036854775808.0;
+    return value > -kEnd && value < kEnd && static_cast<double>(static_cast<std::int64_t>(value)) == value;
+}
 
 // Reads a blob back; false when it is not one of a number.
 bool ReadNumberBlob(std::string_view blob, OCINumber& number);
