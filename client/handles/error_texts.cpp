@@ -23,9 +23,6 @@ static_assert(std::is_sorted(std::begin(kWordings), std::end(kWordings),
                              [](const Wording& left, const Wording& right) { return left.number <= right.number; }),
               "ascending, each number once");
 
-static_assert(std::is_sorted(std::begin(kWordings), std::end(kWordings),
-                             [](const Wording& left, const Wording& right) { return left.number < right.number; }));
-
 // Which numbers have which SQLSTATE. The first row that holds a number decides, so that single numbers stand before the
 // ranges around them.
 struct StateRange {

@@ -15,7 +15,6 @@ Status Targets::FindPlaces(std::size_t columns) {
         bind.workspace.lobs = text_.lobs;
         Place& place = places_.emplace_back(Place{&bind, values::ForColumn(*bind.Type()->out, bind.workspace.column), {}});
         if (bind.InPieces()) place.renderers = values::ForColumn(*bind.Type()->pieces, bind.workspace.column);
-        if (bind.InPieces()) bind.out.clear();
     }
     return {};
 }

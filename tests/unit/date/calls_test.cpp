@@ -95,6 +95,10 @@ TEST_F(DateCalls, TypesHaveTheirParts) {
         EXPECT_EQ(TimeOf(value), has_time ? "1866" : "1878") << c.type << " unset";
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 4)), has_time ? 0 : 1878) << c.type;
         EXPECT_EQ(DateOf(value), has_date ? "1866" : "1878") << c.type << " has a time alone";
+        OraText shown[9];
+        ub4 room = sizeof shown;
+        EXPECT_EQ(Answer(OCIDateTimeToText(env_, err_, value, Text("SS"), 2, 0, nullptr, 0, &room, shown)),
+                  has_date ? 1866 : 0) << c.type;
         EXPECT_EQ(Answer(Construct(value, "+02:00", 250000000)), 0) << c.type;
         EXPECT_EQ(DateOf(value), c.date) << c.type;
         EXPECT_EQ(TimeOf(value), c.time) << c.type;

@@ -120,6 +120,7 @@ std::map<char, Handle> AttributesTest::OneOfEach() {
             {'u', {New<OCISession>(OCI_HTYPE_SESSION), OCI_HTYPE_SESSION}},
             {'t', {New<OCITrans>(OCI_HTYPE_TRANS), OCI_HTYPE_TRANS}},
             {'x', {New<dvoid>(OCI_HTYPE_SUBSCRIPTION), OCI_HTYPE_SUBSCRIPTION}}, {'n', {snapshot, OCI_DTYPE_SNAP}},
+            {'X', {New<dvoid>(OCI_HTYPE_SECURITY), OCI_HTYPE_SECURITY}},
             {'i', {item, parameter}}, {'k', {Below(table, OCI_ATTR_LIST_COLUMNS, 1), parameter}},
             {'T', {table, parameter}}, {'V', {Described("v", OCI_PTYPE_VIEW), parameter}},
             {'L', {Attribute<dvoid*>(table, parameter, OCI_ATTR_LIST_COLUMNS), parameter}}, {'S', {schema, parameter}},

@@ -129,6 +129,18 @@ TEST_F(Pools, WhatASessionLeaves) {
     EXPECT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 3114) << "its session is over";
 
     MUST(Get(&svc, err_), Run(svc, "create unique index i on t(n)"));
+    auto* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
+    auto* err = New<OCIError>(OCI_HTYPE_ERROR);
+    AtOnce(2, [&](int index) {    // a break reaches the connection that came from the pool
+        if (index == 0) {
+            EXPECT_EQ(Run(svc, "insert into t with recursive r(n) as (select 1 union all select n + 1 from r where"
+                               " n < 20000000) select count(*) from r"), 1013);
+            return;
+        }
+        for (ub1 busy = 0; busy == 0; std::this_thread::yield())
+            EXPECT_EQ(OCIAttrGet(server, OCI_HTYPE_SERVER, &busy, nullptr, OCI_ATTR_SERVER_BUSY, err), OCI_SUCCESS);
+        EXPECT_EQ(OCIBreak(svc, err), OCI_SUCCESS);
+    });
     EXPECT_EQ(Run(svc, "insert into t values(2)"), 1) << "the release has committed";
     MUST(Run(svc, "insert into t values(3)"), Destroy(OCI_SPD_FORCE));
     EXPECT_EQ(Run(svc, "insert into t values(4)"), 1012);

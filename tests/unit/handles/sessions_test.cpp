@@ -232,6 +232,8 @@ TEST_F(Sessions, AttachedDetachedAndAskedByThreads) {
     });
     OCIServerAttach(server, err_, Text("here"), 4, 0);
     EXPECT_STREQ(Attribute<const char*>(server, OCI_HTYPE_SERVER, OCI_ATTR_DBNAME), "here");
+    EXPECT_EQ(Answer(OCIServerDetach(server, err_, OCI_DEFAULT)), 0);
+    EXPECT_EQ(Attribute<const char*>(server, OCI_HTYPE_SERVER, OCI_ATTR_DBNAME), nullptr);
 }
 
 TEST_F(Sessions, OfOneServerBegunAndEndedByThreads) {

@@ -317,4 +317,28 @@ TEST_F(Lobs, SessionMayEndBeforeItsLocators) {
     EXPECT_EQ(OCIDescriptorFree(lob, OCI_DTYPE_LOB), OCI_SUCCESS);
 }
 
+TEST_F(Lobs, FormsOfEachKind) {
+    Fetch(lob);
+    MustRun("create table n(n nclob)", "insert into n values('x')");
+    Fetch(other, "select n from n", SQLT_DBCLOB);
+    struct Form { OCILobLocator* of; ub1 form; ub2 set; };
+    std::vector<Form> forms{{lob, SQLCS_IMPLICIT, 873}, {other, SQLCS_NCHAR, 2000}};
+    const struct { ub1 type, given, form; ub2 set; } made[] = {
+        {OCI_TEMP_NCLOB, SQLCS_IMPLICIT, SQLCS_NCHAR, 2000}, {OCI_TEMP_NCLOB, SQLCS_NCHAR, SQLCS_NCHAR, 2000},
+        {OCI_TEMP_CLOB, SQLCS_NCHAR, SQLCS_NCHAR, 2000}, {OCI_TEMP_CLOB, 0, SQLCS_IMPLICIT, 873},
+        {OCI_TEMP_BLOB, SQLCS_NCHAR, 0, 0}};
+    for (const auto& c : made) {
+        forms.push_back({NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB), c.form, c.set});
+        EXPECT_EQ(Answer(OCILobCreateTemporary(svc, err, forms.back().of, 0, c.given, c.type, FALSE, OCI_DURATION_SESSION)), 0);
+    }
+    for (const Form& c : forms) {
+        ub1 form = 9;
+        EXPECT_EQ(Answer(OCILobCharSetForm(env, err, c.of, &form)), 0);
+        EXPECT_EQ(form, c.form);
+        ub2 set = 9;
+        EXPECT_EQ(Answer(OCILobCharSetId(env, err, c.of, &set)), 0);
+        EXPECT_EQ(set, c.set);
+    }
+}
+
 }  // namespace

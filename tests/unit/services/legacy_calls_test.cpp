@@ -136,6 +136,19 @@ TEST_F(LegacyCalls, BesideTheTranscripts) {
     EXPECT_EQ(odescr(&cda, 2, nullptr, nullptr, reinterpret_cast<sb1*>(characters.data()), &length, nullptr, nullptr,
                      nullptr, nullptr), 0);
     EXPECT_EQ(characters[2], '#') << "not terminated";
+    // Arrays whose values, indicators, lengths and codes lie at distances of their own.
+    char values[] = "abcdef", fetched[] = "###############";
+    std::array<sb2, 9> nulls{0, 7, 7, -1, -1, 7, 0, 7, 7};
+    std::array<ub2, 9> lengths{1, 9, 2, 9, 2, 9, 9, 9, 9}, codes{};
+    MUST(Run("delete from t"), Parse("insert into t (n, c) select count(*), :v from t"));
+    MUST(obindps(&cda, 1, T("v"), -1, reinterpret_cast<ub1*>(values), 2, SQLT_CHR, -1, nulls.data(), lengths.data(),
+                 codes.data(), 2, 6, 4, 2, 0, nullptr, nullptr, -1, -1), oexn(&cda, 3, 0), Parse("select c from t order by n"));
+    MUST(odefinps(&cda, 1, 1, reinterpret_cast<ub1*>(fetched), 2, SQLT_CHR, -1, nulls.data(), nullptr, -1, -1,
+                  lengths.data(), codes.data(), 5, 4, 6, 8), oexfet(&cda, 3, 0, 0));
+    EXPECT_STREQ(fetched, "a#########ef###");
+    EXPECT_EQ(nulls, (std::array<sb2, 9>{0, 7, -1, -1, 0, 7, 0, 7, 7}));
+    EXPECT_EQ(lengths, (std::array<ub2, 9>{1, 9, 2, 0, 2, 9, 2, 9, 9}));
+    EXPECT_EQ(codes, (std::array<ub2, 9>{0, 0, 0, 0, 1405, 0, 0, 0, 0}));
 }
 
 TEST_F(LegacyCalls, TextsOfNumbers) {

@@ -156,6 +156,8 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 178);
     EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_NCHARSET_ID), 171);
     EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select '\x81' from dual"), 20, OCI_NTV_SYNTAX, 0)), 24501);
+    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select 1 from dual\0\x81"), 20, OCI_NTV_SYNTAX, 0)), 0)
+        << "it ends at its zero";
     OCIStmt* tagged = nullptr;
     OCIBind* bind = nullptr;
     const auto prepare = [&](const char* sql, const char* tag) {
@@ -169,6 +171,40 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     EXPECT_EQ(Answer(OCIStmtRelease(tagged, err_, Text("\x81"), 1, OCI_DEFAULT)), 24501);
     EXPECT_EQ(Answer(OCIStmtRelease(tagged, err_, nullptr, 0, OCI_DEFAULT)), 0);
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+}
+
+// Each text of the calls on values, where it has a byte that the environment's set lacks.
+TEST_F(NlsCalls, TextsOfValuesThatAreNone) {
+    Nls(178);
+    OCINumber number{};
+    OCIDate day{};
+    auto* const moment = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
+    auto* const interval = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
+    OraText area[80];
+    ub4 size = sizeof area;
+    OCINumberSetZero(err_, &number);
+    MUST(Answer(OCIDateSysDate(err_, &day)), Answer(OCIDateTimeSysTimeStamp(env_, err_, moment)));
+    const OraText *const bad = Text("\x81"), *const one = Text("1"), *const nine = Text("9"), *const year = Text("Y");
+    const sb4 answers[] = {
+        Answer(OCINumberToText(err_, &number, bad, 1, nullptr, 0, &size, area)),
+        Answer(OCINumberToText(err_, &number, nine, 1, bad, 1, &size, area)),
+        Answer(OCINumberFromText(err_, bad, 1, nine, 1, nullptr, 0, &number)),
+        Answer(OCINumberFromText(err_, one, 1, bad, 1, nullptr, 0, &number)),
+        Answer(OCINumberFromText(err_, one, 1, nine, 1, bad, 1, &number)),
+        Answer(OCIDateToText(err_, &day, bad, 1, nullptr, 0, &size, area)),
+        Answer(OCIDateToText(err_, &day, year, 1, bad, 1, &size, area)),
+        Answer(OCIDateFromText(err_, bad, 1, year, 1, nullptr, 0, &day)),
+        Answer(OCIDateFromText(err_, one, 1, bad, 1, nullptr, 0, &day)),
+        Answer(OCIDateFromText(err_, one, 1, year, 1, bad, 1, &day)),
+        Answer(OCIDateNextDay(err_, &day, bad, 1, &day)),
+        Answer(OCIDateTimeToText(env_, err_, moment, bad, 1, 0, nullptr, 0, &size, area)),
+        Answer(OCIDateTimeToText(env_, err_, moment, year, 1, 0, bad, 1, &size, area)),
+        Answer(OCIDateTimeFromText(env_, err_, bad, 1, year, 1, nullptr, 0, moment)),
+        Answer(OCIDateTimeFromText(env_, err_, one, 1, bad, 1, nullptr, 0, moment)),
+        Answer(OCIDateTimeFromText(env_, err_, one, 1, year, 1, bad, 1, moment)),
+        Answer(OCIDateTimeConstruct(env_, err_, moment, 2024, 2, 29, 0, 0, 0, 0, const_cast<OraText*>(bad), 1)),
+        Answer(OCIIntervalFromText(env_, err_, bad, 1, interval))};
+    for (std::size_t index = 0; index < std::size(answers); ++index) EXPECT_EQ(answers[index], 24501) << index;
 }
 
 }  // namespace

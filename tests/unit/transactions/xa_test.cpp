@@ -71,6 +71,7 @@ TEST_F(XaCalls, WhatWasDeferredIsChecked) {
         MUST(Call(kStart, xid, TMNOFLAGS), Run("one", "insert into c values(7)"), Call(kEnd, xid, TMSUCCESS));
         const int code = one_phase ? Call(kCommit, xid, TMONEPHASE) : Call(kPrepare, xid, TMNOFLAGS);
         EXPECT_EQ(code, OnServer() && !one_phase ? XA_RBINTEGRITY : XA_RBROLLBACK);
+        EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS, 2), XAER_NOTA);    // another manager's failure is told beside it
         EXPECT_EQ(Code(), OnServer() && !one_phase ? -2291 : -2091);
         EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), XAER_NOTA);
     }

@@ -263,11 +263,13 @@ TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
     EXPECT_EQ(Answer(OCIStmtRelease(stmt, err, Bytes(half), 2, OCI_DEFAULT)), 24501);
     auto* row = NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
     ASSERT_EQ(Query("select 'AAAAAAAAAAAAAAAAAB' from dual", {{&row, 8, SQLT_RDD}}), 0);
-    for (const ub2 room : {37, 38}) {
+    for (const ub2 room : {0, 35, 36, 37, 38}) {
         std::string shown(38, '#');
         ub2 size = room;
-        EXPECT_EQ(Answer(OCIRowidToChar(row, reinterpret_cast<OraText*>(shown.data()), &size, err)), 0);
-        EXPECT_EQ(shown, Encoded("AAAAAAAAAAAAAAAAAB") + (room == 38 ? std::string(2, '\0') : "##"));
+        EXPECT_EQ(Answer(OCIRowidToChar(row, reinterpret_cast<OraText*>(shown.data()), &size, err)), room < 36 ? 22059 : 0);
+        EXPECT_EQ(size, 36);
+        if (room < 36) EXPECT_EQ(shown, std::string(38, '#'));
+        else EXPECT_EQ(shown, Encoded("AAAAAAAAAAAAAAAAAB") + (room == 38 ? std::string(2, '\0') : "##"));
     }
 }
 
