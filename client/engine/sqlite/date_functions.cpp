@@ -1,5 +1,5 @@
-// Functions of dates, and trunc, which is one of numbers, too, as its sister round is. A null argument makes a null; results are dates without
-// fraction and zone.
+// Functions of dates, and trunc and round, which are of numbers, too. A null argument makes a null; results are dates
+// without fraction and zone.
 #include <algorithm>
 #include <string>
 
