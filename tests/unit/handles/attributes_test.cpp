@@ -120,7 +120,6 @@ std::map<char, Handle> AttributesTest::OneOfEach() {
             {'u', {New<OCISession>(OCI_HTYPE_SESSION), OCI_HTYPE_SESSION}},
             {'t', {New<OCITrans>(OCI_HTYPE_TRANS), OCI_HTYPE_TRANS}},
             {'x', {New<dvoid>(OCI_HTYPE_SUBSCRIPTION), OCI_HTYPE_SUBSCRIPTION}}, {'n', {snapshot, OCI_DTYPE_SNAP}},
-            {'X', {New<dvoid>(OCI_HTYPE_SECURITY), OCI_HTYPE_SECURITY}},
             {'i', {item, parameter}}, {'k', {Below(table, OCI_ATTR_LIST_COLUMNS, 1), parameter}},
             {'T', {table, parameter}}, {'V', {Described("v", OCI_PTYPE_VIEW), parameter}},
             {'L', {Attribute<dvoid*>(table, parameter, OCI_ATTR_LIST_COLUMNS), parameter}}, {'S', {schema, parameter}},
@@ -176,7 +175,13 @@ void AttributesTest::Check(char kind, const Handle& handle, const Known& known) 
 }
 
 TEST_F(AttributesTest, EveryNumberOverEveryKind) {
-    const std::map<char, Handle> handles = OneOfEach();
+    std::map<char, Handle> handles = OneOfEach();
+    char others = 0;    // that only keep what all handles keep
+    for (const ub4 type : {OCI_HTYPE_COMPLEXOBJECT, OCI_HTYPE_SECURITY, OCI_HTYPE_DIRPATH_CTX, OCI_HTYPE_DIRPATH_COLUMN_ARRAY,
+                           OCI_HTYPE_DIRPATH_STREAM, OCI_HTYPE_PROC, OCI_HTYPE_DIRPATH_FN_CTX, OCI_HTYPE_DIRPATH_FN_COL_ARRAY,
+                           OCI_HTYPE_XADSESSION, OCI_HTYPE_XADTABLE, OCI_HTYPE_XADFIELD, OCI_HTYPE_XADGRANULE,
+                           OCI_HTYPE_XADRECORD, OCI_HTYPE_XADIO, OCI_HTYPE_ADMIN})
+        handles[++others] = {New<dvoid>(type), type};
     std::map<ub4, Known> known;
     for (const Known& row : kKnown) known[row.number] = row;
     for (ub4 number = 0; number <= 600; ++number) {
