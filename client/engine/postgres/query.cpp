@@ -148,8 +148,10 @@ Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
         Status again = PrepareAs(told, error_offset);
         return again.Ok() ? again : status;
     }
-    if (!status.Ok() || !RetypesTimes(types)) return status;
-    return PrepareAs(types, error_offset);
+    if (!status.Ok()) return status;
+    const bool retypes = RetypesTimes(types);
+    if (retypes) status = PrepareAs(types, error_offset);
+    return status.Ok() ? PrepareForTexts(std::move(types), error_offset) : status;
 }
 
 Status PgQuery::PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset) {

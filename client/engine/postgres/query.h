@@ -62,6 +62,7 @@ private:
     Status PrepareForObjects(Status status, std::uint32_t& error_offset);
     [[nodiscard]] bool GivesTextsToObjects() const;
     Status FindObjects(bool& found);
+    Status PrepareForTexts(std::vector<Oid> types, std::uint32_t& error_offset);
     [[nodiscard]] std::vector<Oid> DeclaredTypes() const;
     Status PrepareAs(const std::vector<Oid>& types, std::uint32_t& error_offset);
     Status SendPrepared(const std::string& name, const std::string& text, const std::vector<Oid>& types,

@@ -52,7 +52,53 @@ std::string WithOthers(std::string_view sql, const std::vector<Given>& given, co
     return text.append(from, sql.data() + sql.size());
 }
 
+// Placeholders of bytes and row ids that are, by themselves, what an insert or update stores: the numbers from 0.
+std::vector<std::size_t> StoredAlone(std::string_view sql, const std::vector<Kind>& kinds) {
+    std::vector<std::size_t> alone;
+    std::vector<bool> open(1, true);    // at each depth: whether values stand there
+    std::string_view before;
+    const PieceList pieces = Split(sql);
+    for (std::size_t at = 0; at < pieces.size(); before = pieces[at++]) {
+        const std::string_view piece = pieces[at];
+        const std::string_view next = at + 1 < pieces.size() ? pieces[at + 1] : std::string_view();
+        if (piece == "(") open.push_back(IsWord(before, "values"));
+        if (piece == ")" && open.size() > 1) open.pop_back();
+        if (!piece.starts_with('$') || !open.back()) continue;
+        const bool begins = before == "(" || before == "," || before == "=";
+        const bool ends = next.empty() || next == ")" || next == "," || next == ";" || IsName(next);
+        const auto number = static_cast<std::size_t>(std::strtoul(std::string(piece.substr(1)).c_str(), nullptr, 10));
+        const Kind kind = number > 0 && number <= kinds.size() ? kinds[number - 1] : Kind::null;
+        if (begins && ends && (kind == Kind::bytes || kind == Kind::row_id)) alone.push_back(number - 1);
+    }
+    return alone;
+}
+
 }  // namespace
+
+// Bytes for a column of texts are their digits. The server would write them, and row ids, in a notation of its own.
+Status PgQuery::PrepareForTexts(std::vector<Oid> types, std::uint32_t& error_offset) {
+    if (effect_ != Effect::changes || (verb_ != Verb::insert && verb_ != Verb::update)) return {};
+    const std::vector<std::size_t> alone = StoredAlone(text_, kinds_);
+    if (alone.empty()) return {};
+    std::vector<Oid> asked = types;
+    for (const std::size_t index : alone) asked[index] = 0;
+    const std::string name = connection_.NewName();
+    Result description;
+    std::uint32_t offset = 0;
+    if (Status told = SendPrepared(name, text_, asked, description, offset); !told.Ok())
+        return connection_.Broken() ? told : Status();
+    connection_.Forget(name);
+    bool any = false;
+    for (const std::size_t index : alone) {
+        Oid base = PQparamtype(description.get(), static_cast<int>(index));
+        if (Status status = connection_.BaseType(base); !status.Ok()) return status;
+        if (!IsTextType(base)) continue;
+        if (kinds_[index] == Kind::row_id) return Refused(errors::kInconsistentTypes);
+        types[index] = base;
+        any = true;
+    }
+    return any ? PrepareAs(types, error_offset) : Status();
+}
 
 // The server reads a text for such a column as the number of an object.
 bool PgQuery::GivesTextsToObjects() const {

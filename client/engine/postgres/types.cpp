@@ -12,6 +12,7 @@
 #include "engine/pieces.h"
 #include "handles/errors.h"
 #include "oci.h"
+#include "platform/hexadecimal.h"
 
 namespace engine::postgres {
 namespace {
@@ -539,7 +540,14 @@ int BoundValues::Write(std::size_t index, const Datum& value) {
             if (room.empty()) return errors::kInvalidNumber;
             break;
         case Kind::text: return WriteText(index, value.Text());
-        case Kind::bytes: Point(index, value.data, value.length, true); return 0;
+        case Kind::bytes:
+            if (!IsTextType(types_[index])) {
+                Point(index, value.data, value.length, true);
+                return 0;
+            }
+            room.clear();
+            AppendHex(value.Text(), room);
+            break;
         case Kind::timestamp: return WriteTime(index, value.Timestamp());
         case Kind::row_id:
             room.resize(kTupleIdSize);

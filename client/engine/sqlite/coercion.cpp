@@ -248,12 +248,8 @@ Status Coercion::WriteNumber(Datum& value) {
 }
 
 void Coercion::WriteBytes(Datum& value) {
-    constexpr std::string_view kDigits = "0123456789ABCDEF";
     text_.clear();
-    for (const char byte : value.Text()) {
-        text_.push_back(kDigits[static_cast<unsigned char>(byte) >> 4]);
-        text_.push_back(kDigits[static_cast<unsigned char>(byte) & 15]);
-    }
+    AppendHex(value.Text(), text_);
     Set(value, Kind::text, text_.data(), text_.size());
 }
 
@@ -266,6 +262,7 @@ Status Coercion::ApplyText(Datum& value) {
             break;
         case Kind::bytes: WriteBytes(value); break;
         case Kind::timestamp: SetDate(value.Timestamp(), value); break;
+        case Kind::row_id: return Refuse(errors::kInconsistentTypes);
         default: break;
     }
     // Blanks at the end of a fixed column's text come back when it is read.
