@@ -200,6 +200,15 @@ TEST_F(Postgres, StopIsHeededBehindSignals) {
     EXPECT_EQ(Query("select 1 from pg_sleep(5)"), "error 1013");
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(4));
     breaker.join();
+    EXPECT_TRUE(stop_->Take());
+    MustCommit("create table slow(n integer)",
+               "create function waits() returns trigger language plpgsql as 'begin perform pg_sleep(0.3); return null; end'",
+               "create constraint trigger late after insert on slow initially deferred for each row execute function waits()");
+    ASSERT_EQ(Run("insert into slow values(1)"), 0);
+    stop_->Ask();
+    EXPECT_EQ(Answer(connection_->Commit()), 0) << "what ends a transaction is not disturbed";
+    EXPECT_TRUE(stop_->Take());
+    EXPECT_EQ(Query("select n from slow"), "1;");
 }
 
 TEST_F(Postgres, DeadlockUndoesOneStatement) {
