@@ -117,7 +117,8 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     EXPECT_EQ(taken, "3ab");
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 3, &(taken = ""), Takes, 0, 0)), 0);
     EXPECT_EQ(taken, "1abc2de3\xC3\xA4");
-    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &amount, 1, room, 4, &(taken = "!"), Takes, 0, 0)), 24802);
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 7), 1, room, 4, &(taken = "!"), Takes, 0, 0)), 24802);
+    EXPECT_EQ(amount, 7u) << "a failure tells of none";
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 8, OCI_FIRST_PIECE, &(pieces = {}), Gives, 0, 0)),
               24802);
     const struct { ub4 length; ub1 piece; sb4 answer; } odd[] = {
