@@ -78,6 +78,8 @@ std::vector<std::size_t> StoredAlone(std::string_view sql, const std::vector<Kin
 // Bytes for a column of texts are their digits. The server would write them, and row ids, in a notation of its own.
 Status PgQuery::PrepareForTexts(std::vector<Oid> types, std::uint32_t& error_offset) {
     if (effect_ != Effect::changes || (verb_ != Verb::insert && verb_ != Verb::update)) return {};
+    const auto is_concerned = [](Kind kind) { return kind == Kind::bytes || kind == Kind::row_id; };
+    if (std::none_of(kinds_.begin(), kinds_.end(), is_concerned)) return {};    // most statements are not read
     const std::vector<std::size_t> alone = StoredAlone(text_, kinds_);
     if (alone.empty()) return {};
     std::vector<Oid> asked = types;
