@@ -90,13 +90,14 @@ Status PgConnection::Prepare(const Xid& xid, bool& read_only) {
     return !status.Ok() && in_transaction_ ? Lose(status) : status;
 }
 
+// One that was prepared in another database of the server, which it answers with what it does not support, is none of this.
 Status PgConnection::FinishPrepared(const char* verb, const Xid& xid) {
     const std::string command = std::string(verb) + " prepared '" + NameOf(xid) + "'";
     if (!home_->TwoPhase()) return Refused(errors::kUnsupported, "the server has max_prepared_transactions = 0");
     if (Status status = Enter(); !status.Ok()) return status;
     if (in_transaction_) return Refused(24776, "a transaction is open");
     Status status = wire_->Run(command.c_str());
-    const bool missing = status.Number() == errors::kNoSuchObject;
+    const bool missing = status.Number() == errors::kNoSuchObject || status.Number() == errors::kUnsupported;
     return missing ? Refused(kNoSuchBranch) : status;
 }
 
