@@ -15,9 +15,10 @@ namespace {
 
 using Spellings = std::span<const engine::Dialect::Spelling>;
 
-// The application's q'[text]' as a plain literal.
+// The application's q'[text]' or n'text' as a plain literal.
 std::string PlainLiteral(std::string_view q_literal) {
     const std::size_t quote = q_literal.find('\'');
+    if (q_literal[quote - 1] == 'n' || q_literal[quote - 1] == 'N') return std::string(q_literal.substr(quote));
     std::string literal = "'";
     for (const char c : q_literal.substr(quote + 2, q_literal.size() - quote - 4)) literal.append(c == '\'' ? 2 : 1, c);
     return literal += '\'';

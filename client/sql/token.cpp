@@ -54,6 +54,7 @@ Token Tokenizer::Next() {
         const std::string_view word = text_.substr(at_, end - at_);
         const bool is_q = EqualsLower(word, "q") || EqualsLower(word, "nq");
         if (is_q && Peek(word.size()) == '\'') return QLiteral(end);
+        if (EqualsLower(word, "n") && Peek(1) == '\'') return Quoted(TokenKind::q_literal, end);
         return Take(TokenKind::word, end);
     }
     if (IsDigit(c) || (c == '.' && IsDigit(Peek(1)))) return Number();

@@ -15,7 +15,7 @@ enum class TokenKind : std::uint8_t {
     quoted_word,    // "Name", quotes included
     number,
     literal,        // 'text', quotes included
-    q_literal,      // q'[text]', all included
+    q_literal,      // q'[text]', n'text', all included
     placeholder,    // :name, :1, :"Name" or ?, the mark included
     symbol,         // an operator or a single character
     unclosed,       // a quote that never closes, to the end of the text

@@ -187,8 +187,18 @@ create or replace function kelp.lpad(text, numeric, text default ' ') returns te
 return nullif(pg_catalog.lpad($1, trunc($2)::int, $3), '');
 create or replace function kelp.rpad(text, numeric, text default ' ') returns text immutable parallel safe language sql
 return nullif(pg_catalog.rpad($1, trunc($2)::int, $3), '');
+create or replace function kelp.lpad(text, int) returns text immutable parallel safe language sql
+return nullif(pg_catalog.lpad($1, $2), '');
+create or replace function kelp.lpad(text, int, text) returns text immutable parallel safe language sql
+return nullif(pg_catalog.lpad($1, $2, $3), '');
+create or replace function kelp.rpad(text, int) returns text immutable parallel safe language sql
+return nullif(pg_catalog.rpad($1, $2), '');
+create or replace function kelp.rpad(text, int, text) returns text immutable parallel safe language sql
+return nullif(pg_catalog.rpad($1, $2, $3), '');
 create or replace function kelp.replace(text, text) returns text immutable parallel safe language sql
-return nullif(pg_catalog.replace($1, $2, ''), '');
+return nullif(pg_catalog.replace($1, coalesce($2, ''), ''), '');
+create or replace function kelp.replace(text, text, text) returns text immutable parallel safe language sql
+return nullif(pg_catalog.replace($1, coalesce($2, ''), coalesce($3, '')), '');
 create or replace function kelp.hextoraw(text) returns bytea immutable parallel safe language sql
 return pg_catalog.decode($1, 'hex');
 create or replace function kelp.empty_clob() returns text immutable parallel safe language sql return ''::text;
@@ -268,7 +278,7 @@ begin
         end;
     end loop;
 end $$;
-comment on schema kelp is 'libkelpci 4';
+comment on schema kelp is 'libkelpci 5';
 commit;
 )sql";
 

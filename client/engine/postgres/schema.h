@@ -4,7 +4,7 @@
 namespace engine::postgres {
 
 // Made anew where the comment on the schema is another one.
-inline constexpr const char* kSchemaVersion = "libkelpci 4";
+inline constexpr const char* kSchemaVersion = "libkelpci 5";
 
 // Commands, for a connection of a user who may create a schema; what is there already is replaced. Fails as a whole.
 extern const char* const kSchemaCommands;

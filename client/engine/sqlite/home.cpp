@@ -27,6 +27,8 @@ Status OpenFile(const std::string& name, int flags, DatabaseHandle& handle) {
     if (code != SQLITE_OK) return opened ? Failure(opened, code) : Failure(code, sqlite3_errstr(code));
     sqlite3_busy_timeout(opened, kOpeningWait);
     sqlite3_db_config(opened, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);    // nobody writes the schema as a table
+    sqlite3_db_config(opened, SQLITE_DBCONFIG_DQS_DML, 0, nullptr);      // an unknown name in double quotes is no text
+    sqlite3_db_config(opened, SQLITE_DBCONFIG_DQS_DDL, 0, nullptr);
     return {};
 }
 

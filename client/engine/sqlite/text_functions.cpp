@@ -117,6 +117,27 @@ void SubStr(sqlite3_context* context, int count, Arguments arguments) {
     sqlite3_result_text64(context, part.data(), part.size(), SQLITE_TRANSIENT, SQLITE_UTF8);
 }
 
+// replace(text, part), replace(text, part, other): without one the parts go. Nothing is found of a null.
+void Replace(sqlite3_context* context, int count, Arguments arguments) {
+    if (AnyNull(1, arguments)) return sqlite3_result_null(context);
+    const TextArgument text(arguments[0]);
+    const TextArgument part(arguments[1]);
+    const std::string_view other = count > 2 ? TextOf(arguments[2]) : "";
+    const int failure = text.Failure() != 0 ? text.Failure() : part.Failure();
+    if (failure != 0) return Refuse(context, failure);
+    std::string_view rest = text.Text();
+    std::string replaced;
+    while (!part.Text().empty()) {
+        const std::size_t found = rest.find(part.Text());
+        if (found == std::string_view::npos) break;
+        replaced.append(rest.substr(0, found)).append(other);
+        rest.remove_prefix(found + part.Text().size());
+    }
+    replaced.append(rest);
+    if (replaced.empty()) return sqlite3_result_null(context);
+    sqlite3_result_text64(context, replaced.data(), replaced.size(), SQLITE_TRANSIENT, SQLITE_UTF8);
+}
+
 // -1, 0, 1 in `order`: as numbers when one of them is one, else by bytes. Neither is null. 0 or an error number.
 int CompareValues(sqlite3_value* left, sqlite3_value* right, int& order) {
     if (!IsNumber(left) && !IsNumber(right)) {
@@ -167,6 +188,7 @@ constexpr FunctionRow kRows[] = {
     {"rpad", 2, 3, SQLITE_DETERMINISTIC, Pad<Side::right>, "varchar2"},
     {"instr", 2, 4, SQLITE_DETERMINISTIC, InStr, "number"},
     {"substr", 2, 3, SQLITE_DETERMINISTIC, SubStr},
+    {"replace", 2, 3, SQLITE_DETERMINISTIC, Replace, "varchar2"},
     {"greatest", 1, kAnyCount, SQLITE_DETERMINISTIC, Extreme<1>, "", 1},
     {"least", 1, kAnyCount, SQLITE_DETERMINISTIC, Extreme<-1>, "", 1},
     {"decode", 3, kAnyCount, SQLITE_DETERMINISTIC, Decode, "", 3},
