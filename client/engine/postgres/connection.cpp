@@ -137,7 +137,7 @@ void PgConnection::SendRelease(Guard guard) noexcept {
 Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
     const Wire::Heeding undisturbed(*wire_, false);
     Note();
-    if (status.Ok() || !in_transaction_) return guard == Guard::savepoint && status.Failed() ? RolledBack(status) : status;
+    if (status.Ok() || !in_transaction_) return guard == Guard::savepoint && status.Failed() ? Undone(status) : status;
     if (guard == Guard::savepoint) {
         wire_->Send(kUndoGuard);
         wire_->Send(kDropGuard);
@@ -150,15 +150,17 @@ Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
     if (guard == Guard::none && wire_->Transaction() == PQTRANS_INTRANS) return status;
     (void)wire_->Run("rollback");
     Note();
-    return guard == Guard::none ? RolledBack(status) : status;
+    return guard == Guard::none ? Undone(status) : status;
 }
 
 // The server has given the transaction up with a failure.
 Status PgConnection::Lose(const Status& failure) noexcept {
     (void)wire_->Run("rollback");
     Note();
-    return RolledBack(failure);
+    return Undone(failure);
 }
+
+Status PgConnection::Undone(const Status& failure) noexcept { return loss_ = RolledBack(failure); }
 
 Status PgConnection::DropGuard() noexcept { return wire_->Run(kDropGuard); }
 
@@ -300,6 +302,7 @@ Status PgConnection::Commit() {
     }
     Status status = wire_->Run("commit");
     Note();
+    if (in_transaction_ && !status.Ok()) return Lose(status);
     const bool violated = status.Number() == 1 || status.Number() == errors::kParentMissing ||
                           status.Number() == errors::kChildFound || status.Number() == errors::kCheckViolated;
     return violated && !in_transaction_ ? Refused(errors::kRolledBack, status.Detail()) : status;
@@ -312,7 +315,7 @@ Status PgConnection::Rollback() {
     lobs_->Forget();
     Status status = wire_->Run("rollback");
     Note();
-    return status;
+    return !status.Ok() && in_transaction_ ? Lose(status) : status;
 }
 
 Status PgConnection::Ping() {

@@ -97,6 +97,7 @@ public:
     // Once the batch is read: goes back to where the guard stood if it has failed, and tells whether the transaction was
     // lost with it. `ran`: the statement did more than to be prepared, so that there may be something to undo.
     Status Settle(Guard guard, Status status, bool ran = true) noexcept;
+    [[nodiscard]] const Status& Loss() const { return loss_; }    // what took the last transaction with it
     // Ends the savepoint of a statement whose batch ended before it.
     Status DropGuard() noexcept;
 
@@ -129,6 +130,7 @@ private:
     Status SetPath();
     [[nodiscard]] std::size_t LastMark() const noexcept;    // its place; the count of savepoints: there is none
     Status Lose(const Status& failure) noexcept;
+    Status Undone(const Status& failure) noexcept;
     Status TellLockWait();
     void ForgetLockWait() noexcept;
     Status FinishPrepared(const char* verb, const Xid& xid);
@@ -137,6 +139,7 @@ private:
     Credentials credentials_;
     std::unique_ptr<Wire> wire_;
     bool in_transaction_ = false;
+    Status loss_;
     bool changed_ = false;              // by what is known of; functions of queries may have done so, too
     std::string branch_question_;       // the statement on the server that tells of a branch; empty: there is none yet
     struct Savepoint {

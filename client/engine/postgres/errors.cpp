@@ -1,9 +1,11 @@
 // SQLSTATEs and what libpq says of connections: one table row a state, or a beginning of one.
 #include "engine/postgres/errors.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <iterator>
 #include <new>
 #include <string>
 
@@ -208,10 +210,18 @@ Status ConnectFailure(std::string_view message) noexcept {
     return Refused(12560, Trimmed(message));
 }
 
+bool IsPassing(const Status& failure) noexcept {
+    static constexpr int kPassing[] = {18, 60, 4031, errors::kOutOfMemory, errors::kCancelled, errors::kNoRoom, errors::kResourceBusy,
+                                       errors::kCannotSerialise, errors::kRolledBack, errors::kInputOutputError};
+    return std::find(std::begin(kPassing), std::end(kPassing), failure.Number()) != std::end(kPassing);
+}
+
 Status RolledBack(const Status& failure) noexcept try {
+    constexpr std::string_view kLost = "the transaction was rolled back";
     std::string detail = failure.Detail();
+    if (detail.ends_with(kLost)) return failure;
     if (!detail.empty()) detail += "; ";
-    return Error(failure.Number(), detail.append("the transaction was rolled back")).From(kEngine);
+    return Error(failure.Number(), detail.append(kLost)).From(kEngine);
 } catch (const std::bad_alloc&) {
     return Error(failure.Number()).From(kEngine);
 }

@@ -23,6 +23,9 @@ Status ConnectFailure(std::string_view message) noexcept;
 // An error of this engine's own.
 Status Refused(int number, std::string_view words = {}) noexcept;
 
+// Whether it tells of the moment, and nothing of what was asked: the same might be answered a little later.
+bool IsPassing(const Status& failure) noexcept;
+
 // A failure that has taken the transaction with it: the record says so, too.
 Status RolledBack(const Status& failure) noexcept;
 

@@ -97,9 +97,16 @@ bool PgQuery::InsertsRows() const {
     return has("values") && !has("select") && !has("returning") && !has("--");
 }
 
-// A row's place is told by the insert itself, where the table has such a thing.
+// Some of what is asked on the way may fail, but not if it takes the transaction with it.
 Status PgQuery::Prepare(std::uint32_t& error_offset) {
     if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return {};
+    const bool within = connection_.InTransaction();
+    Status status = PrepareText(error_offset);
+    return within && !connection_.InTransaction() && !connection_.Broken() ? connection_.Loss() : status;
+}
+
+// A row's place is told by the insert itself, where the table has such a thing.
+Status PgQuery::PrepareText(std::uint32_t& error_offset) {
     tail_ = InsertsRows() ? kReturningRow : std::string_view();
     Status status = PrepareTyped(error_offset);
     if (!tail_.empty() && !status.Ok() && !connection_.Broken()) {
@@ -118,7 +125,7 @@ Status PgQuery::PrepareLobs() {
     std::string name = connection_.NewName();
     const auto fields = static_cast<int>(columns_.size() + lobs_.size() + kFieldsOfPlace);
     Status status = text.empty() ? Refused(errors::kUnsupported) : SendPrepared(name, text, bound_.Types(), description, offset);
-    if (connection_.Broken()) return status;
+    if (connection_.Broken() || IsPassing(status)) return status;
     has_places_ = status.Ok() && PQnfields(description.get()) == fields;
     if (has_places_) connection_.Forget(std::exchange(name_, std::move(name)));
     else if (status.Ok()) connection_.Forget(name);
@@ -250,6 +257,15 @@ Status PgQuery::PrepareAnew() {
     return Prepare(offset);
 }
 
+// Whether what failed is prepared anew; if that fails, this is the answer.
+bool PgQuery::Renews(Status& failure) {
+    if (!IsStale(failure)) return false;
+    Status anew = PrepareAnew();
+    const bool is_new = anew.Ok();
+    if (!is_new) failure = std::move(anew);
+    return is_new;
+}
+
 // ---- Executions
 
 Status PgQuery::Load(RowSource& source, std::uint32_t row) noexcept try {
@@ -282,7 +298,7 @@ Status PgQuery::ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& 
     Status status = Load(source, row);
     if (!status.Ok()) return status;
     Wire& server = connection_.Server();
-    for (int runs = 0; runs == 0 || (runs == 1 && IsStale(status) && PrepareAnew().Ok()); ++runs) {
+    for (int runs = 0; runs == 0 || (runs == 1 && Renews(status)); ++runs) {
         const PgConnection::Guard guard = connection_.SendGuard(false);
         server.SendExecute(name_.c_str(), bound_.Values(), binary_);
         connection_.SendRelease(guard);
@@ -327,6 +343,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
         Batch batch;
         const bool whole = row >= singly && row < stop && !delivers && stop == run.last && PrepareWhole(run.last - row);
+        if (was_in_transaction && !connection_.InTransaction()) return connection_.Broken() ? connection_.Server().Lost() : connection_.Loss();
         if (whole) {
             batch = TryWhole(source, row, run.last);
             singly = row + std::max(batch.sent, 1U);
@@ -353,8 +370,9 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         size = failure.Ok() ? std::min(2 * size, kLargestBatch) : std::max(size / 8, 1U);
         if (failure.Ok()) failure = std::move(batch.refusal);
         if (failure.Ok()) continue;
-        if (connection_.Broken() || (was_in_transaction && !connection_.InTransaction())) return failure;
-        if (IsStale(failure) && !std::exchange(renewed, true) && PrepareAnew().Ok()) continue;
+        const auto is_lost = [&] { return connection_.Broken() || (was_in_transaction && !connection_.InTransaction()); };
+        if (!is_lost() && !std::exchange(renewed, renewed || IsStale(failure)) && Renews(failure)) continue;
+        if (is_lost()) return failure;
         const bool stops = !run.all_rows || failure.Number() == errors::kCancelled;
         outcome.failures.push_back({row, std::move(failure)});
         if (stops) break;
@@ -387,9 +405,11 @@ PgQuery::Batch PgQuery::RunBatch(RowSource& source, std::uint32_t first, std::ui
     const Wire::Heeding heeding(server, heeds && !batch.refused);
     batch.failure = connection_.PassGuard(guard);
     if (batch.failure.Ok()) ReadBatch(batch);
+    const bool all_done = batch.failure.Ok();
     Status rest = server.Drain();
-    if (batch.failure.Ok()) batch.failure = std::move(rest);
+    if (all_done) batch.failure = std::move(rest);
     batch.failure = connection_.Settle(guard, std::move(batch.failure));
+    if (all_done && !batch.failure.Ok()) batch.done = 0;    // the end of the batch has failed: none of its rows is to blame
     return batch;
 }
 

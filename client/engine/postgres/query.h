@@ -72,8 +72,10 @@ private:
     Status PrepareLobs();
     [[nodiscard]] bool InsertsRows() const;
     bool RetypesTimes(std::vector<Oid>& types) const;
+    Status PrepareText(std::uint32_t& error_offset);
     Status PrepareAnew();
     [[nodiscard]] bool IsStale(const Status& status) const;
+    bool Renews(Status& failure);
     Status Load(RowSource& source, std::uint32_t row) noexcept;
 
     Status ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& outcome);

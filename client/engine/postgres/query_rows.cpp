@@ -20,9 +20,8 @@ Status PgQuery::Open(RowSource& source, const QueryRun& run) {
     if (Status status = connection_.Enter(effect_); !status.Ok()) return status;
     Status status = Load(source, run.row);
     if (status.Ok()) status = Start(run);
-    if (IsStale(status)) {
-        status = PrepareAnew();
-        if (status.Ok()) status = Load(source, run.row);
+    if (Renews(status)) {
+        status = Load(source, run.row);
         if (status.Ok()) status = Start(run);
     }
     return status;
