@@ -225,28 +225,9 @@ TEST_F(AttributesTest, DigitsOfDatetimes) {
         EXPECT_EQ(Attribute<ub1>(column, OCI_DTYPE_PARAM, OCI_ATTR_FSPRECISION), 3);
         EXPECT_EQ(Name(column, OCI_ATTR_LFPRECISION), "!24315");
     }
-    // Characters that show a value, bytes that hold it, and what is told of texts alone.
-    ASSERT_EQ(Run("create table w(a timestamp(3) with local time zone, b interval year(4) to month,"
-                  " c interval day(5) to second(6), d interval day(5) to second(0), e raw(10), f nvarchar2(7), g clob,"
-                  " h long, i varchar2, j date, k number(3), l binary_float, m timestamp)", 1), 0);
     ASSERT_EQ(Run("create table x(n integer primary key) without rowid", 1), 0);
     for (const auto& [name, is_index] : {std::pair{"t", 0}, {"x", 1}})
         EXPECT_EQ(Attribute<ub1>(Described(name, OCI_PTYPE_TABLE), OCI_DTYPE_PARAM, OCI_ATTR_INDEX_ONLY), is_index);
-    ASSERT_EQ(Run("select * from w", 0), 0);
-    ub4 position = 0;
-    const struct { ub4 shown; ub2 size, set; ub1 form; } columns[] = {
-        {31, 11, 0, 0}, {8, 5, 0, 0}, {22, 11, 0, 0}, {15, 11, 0, 0}, {20, 10, 0, 0}, {28, 28, 873, SQLCS_NCHAR},
-        {4000, 4000, 873, 1}, {4000, 4000, 873, 1}, {4000, 4000, 873, 1}, {9, 7, 0, 0}, {40, 22, 0, 0}, {40, 4, 0, 0},
-        {31, 11, 0, 0}};
-    for (const auto& c : columns) {
-        ASSERT_EQ(Member(stmt_, &item, ++position, OCI_HTYPE_STMT), 0);
-        EXPECT_EQ(Attribute<ub4>(item, OCI_DTYPE_PARAM, OCI_ATTR_DISP_SIZE), c.shown) << position;
-        EXPECT_EQ(Attribute<ub2>(item, OCI_DTYPE_PARAM, OCI_ATTR_DATA_SIZE), c.size) << position;
-        EXPECT_EQ(Attribute<ub2>(item, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_ID), c.set) << position;
-        EXPECT_EQ(Attribute<ub1>(item, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_FORM), c.form) << position;
-    }
-    ASSERT_EQ(Member(stmt_, &item, 1, OCI_HTYPE_STMT), 0);
-    EXPECT_EQ(Attribute<ub1>(item, OCI_DTYPE_PARAM, OCI_ATTR_FSPRECISION), 3);
 }
 
 // Kept to itself: nothing fails over.

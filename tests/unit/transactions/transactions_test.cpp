@@ -65,26 +65,6 @@ TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
     EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24756);
 }
 
-// A session that goes without a word takes its branch with it; a result does not outlive the connection.
-TEST_F(Transactions, SessionsThatGo) {
-    MUST(Start(0, 0, OCI_TRANS_NEW), Run(0, "insert into t values(1)"));
-    EXPECT_EQ(Answer(OCILogoff(svc_[0], err_)), 2089);
-    EXPECT_EQ(OCIHandleFree(svc_[0], OCI_HTYPE_SVCCTX), OCI_SUCCESS);
-    EXPECT_EQ(Start(1, 0, OCI_TRANS_RESUME), 24756);
-    EXPECT_EQ(Start(1, 0, OCI_TRANS_NEW), 0);
-    EXPECT_EQ(Run(1, "insert into t values(1)"), 0) << "the lock is free";
-    EXPECT_EQ(Run(1, "create table u(n number)"), 2089);
-    ub4 number = 0;
-    OCIDefine* define = nullptr;
-    const char* const query = "select n from t";
-    EXPECT_EQ(OCIStmtPrepare(stmt_, err_, Text(query), Length(query), OCI_NTV_SYNTAX, OCI_DEFAULT), 0);
-    EXPECT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &number, 4, SQLT_UIN, nullptr, nullptr, nullptr, 0)), 0);
-    EXPECT_EQ(Answer(OCIStmtExecute(svc_[1], stmt_, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
-    EXPECT_EQ(Answer(OCITransDetach(svc_[1], err_, OCI_DEFAULT)), 0);
-    EXPECT_EQ(Answer(OCIStmtFetch2(stmt_, err_, 1, OCI_FETCH_NEXT, 0, OCI_DEFAULT)), 1002);
-    EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
-}
-
 // A statement that rolls all back by itself ends the branch's work, and the branch with its next call.
 TEST_F(Transactions, WhatTheEngineUndoesIsLost) {
     ASSERT_EQ(Run(0, "create table u(n integer primary key)"), 0);
