@@ -17,7 +17,9 @@
 //                                  that pointers there lead to, up to a null pointer
 //   call:KIND:ARGUMENT...          calls what the driver has installed and records what it gave (CallBack says how)
 //
-// Answers for a function are used in order, the last one again and again; without any the result is 0. A result of 0
+// Answers for a function are used in order, the last one again and again; behind a line "in turns", the first one comes
+// again behind the last. FUNCTION@NUMBER:NUMBER...,... has the answers of calls whose integers are these or the ones behind
+// the comma; * stands for functions without any of their own. Without any answer the result is 0. A result of 0
 // hands out a new object through the first pointer to a pointer; of a function that returns a pointer, 0 is null and
 // anything else a new object.
 #include <algorithm>
@@ -70,6 +72,7 @@ struct Argument {
 struct State {
     std::mutex mutex;
     std::map<std::string, std::deque<Answer>> answers;
+    bool in_turns = false;
     std::map<const void*, size_t> objects;
     std::deque<std::vector<char>> memory;
     Installed installed;
@@ -109,6 +112,14 @@ Answer ReadAnswer(std::istringstream& words) {
     return answer;
 }
 
+void AddAnswer(State& state, const std::string& function, const Answer& answer) {
+    const size_t at = std::min(function.find('@'), function.size());
+    std::istringstream integers(function.substr(at));
+    if (at == function.size()) state.answers[function].push_back(answer);
+    for (std::string text; std::getline(integers, text, ',');)
+        state.answers[function.substr(0, at + 1) + text.substr(text[0] == '@')].push_back(answer);
+}
+
 State* MakeState() {
     auto* state = new State;
     if (const char* log = std::getenv("PROBE_LOG")) state->log = std::fopen(log, "a");
@@ -117,7 +128,9 @@ State* MakeState() {
         for (std::string line; std::getline(lines, line);) {
             std::istringstream words(line);
             std::string function;
-            if (words >> function && function[0] != '#') state->answers[function].push_back(ReadAnswer(words));
+            if (!(words >> function) || function[0] == '#') continue;
+            if (function == "in") state->in_turns = true;
+            else AddAnswer(*state, function, ReadAnswer(words));
         }
     }
     return state;
@@ -129,11 +142,18 @@ State& TheState() {
     return *state;
 }
 
-Answer NextAnswer(State& state, const char* function) {
-    const auto found = state.answers.find(function);
+Answer NextAnswer(State& state, const std::string& function, const std::vector<Argument>& arguments) {
+    std::string integers;
+    for (const Argument& argument : arguments)
+        if (argument.form == Argument::integer) integers += (integers.empty() ? "@" : ":") + std::to_string(argument.number);
+    auto found = state.answers.find(function + integers);
+    if (found == state.answers.end()) found = state.answers.find(function);
+    if (found == state.answers.end()) found = state.answers.find("*");
     if (found == state.answers.end()) return {};
-    const Answer answer = found->second.front();
-    if (found->second.size() > 1) found->second.pop_front();
+    std::deque<Answer>& answers = found->second;
+    const Answer answer = answers.front();
+    if (state.in_turns) answers.push_back(answer);
+    if (answers.size() > 1) answers.pop_front();
     return answer;
 }
 
@@ -449,8 +469,8 @@ struct Entry<Result(Parameters...), kIndex> {
     static Result Called(Parameters... parameters) {
         State& state = TheState();
         const std::lock_guard lock(state.mutex);
-        const Answer answer = NextAnswer(state, kNames[kIndex]);
         std::vector<Argument> arguments{Describe(parameters)...};
+        const Answer answer = NextAnswer(state, kNames[kIndex], arguments);
         // An array of XIDs is there to be filled.
         if (sizeof...(Parameters) > 3 && arguments[0].form == Argument::xid) arguments[0].form = Argument::pointer;
         Record(state, kNames[kIndex], arguments, answer.result);
