@@ -1,6 +1,4 @@
-// The tables of named objects: capacities and messages written down by hand, names, arrays, reserved words.
-#include <cstring>
-
+// The tables of named objects: capacities and messages written down by hand.
 #include "objects/areas.h"
 #include "objects/buffers.h"
 #include "objects/registry.h"
@@ -8,7 +6,7 @@
 
 namespace {
 
-int object_a, object_b;  // stand for what the library returned
+int object_a;  // stands for what the library returned
 
 TEST(Registry, CapacitiesAndMessages) {
     // A kind without the last word says nothing of a name in use.
@@ -70,45 +68,6 @@ TEST(Registry, AreasStayWhereTheyAreUntilTheyAreReleased) {
     EXPECT_EQ(Printed([] { EXPECT_EQ(ResolveArea(Kind::ldainfo, "n7").area, nullptr); }), "Handle n7 not found\n");
     for (const Kind kind : {Kind::cursor, Kind::ldainfo})
         for (NamedArea& slot : Areas(kind)) if (slot.in_use) ReleaseArea(slot);
-}
-
-TEST(Registry, NamesAreCutToTheSlot) {
-    const std::string long_name(40, 'n');
-    const struct { Kind kind; size_t kept; } cases[] = {{Kind::stmt, 31}, {Kind::lob, 31}, {Kind::spool, 35}};
-    for (const auto& c : cases) {
-        NamedObject* slot = Register(c.kind, long_name.c_str(), &object_a, nullptr);
-        EXPECT_EQ(slot->name, long_name.substr(0, c.kept));
-        EXPECT_EQ(ResolveObject(c.kind, long_name.c_str()), &object_a);
-        EXPECT_EQ(ResolveObject(c.kind, (long_name.substr(0, c.kept) + "another end").c_str()), &object_a);
-        EXPECT_EQ(Printed([&] { ResolveObject(c.kind, long_name.substr(0, c.kept - 1).c_str()); }),
-                  "Handle " + long_name.substr(0, c.kept - 1) + " not found\n");
-        Release(c.kind, long_name.c_str());
-    }
-}
-
-TEST(Registry, AnIndexSelectsFromAnArrayOfDescriptors) {
-    void* array[] = {&object_a, &object_b};
-    AsRecord<Kind::lob>(Register(Kind::lob, "arr", array, nullptr))->array_count = 2;
-    Register(Kind::lob, "one", &object_b, nullptr);
-    const struct { const char* word; void* object; bool is_array; long index; } cases[] = {
-        {"arr[0]", &object_a, false, 0}, {"arr[1]", &object_b, false, 1}, {"arr[2]", array, true, 2},
-        {"arr", array, true, 0}, {"arr[-1]", array, true, -1}, {"arr[1x", &object_b, false, 1},
-        {"arr[]", &object_a, false, 0}, {"one[5]", &object_b, false, 5}, {"one", &object_b, false, 0},
-        {"invalid", InvalidObject(), false, 0}};
-    for (const auto& c : cases) {
-        const DescriptorReference found = ResolveDescriptor(Kind::lob, c.word);
-        EXPECT_EQ(found.object, c.object) << c.word;
-        EXPECT_EQ(found.is_array, c.is_array) << c.word;
-        EXPECT_EQ(found.index, c.index) << c.word;
-    }
-    Release(Kind::lob, "arr");
-    EXPECT_EQ(Register(Kind::lob, "after", &object_a, nullptr), &*SlotsOf(Kind::lob).begin());
-    EXPECT_EQ(ResolveObject(Kind::lob, "after[0]"), &object_a) << "a single descriptor in the slot of an array";
-    Release(Kind::lob, "after");
-    EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "arr2[1]"); }), "Handle arr2 not found\n");
-    EXPECT_EQ(Printed([] { ResolveObject(Kind::lob, "null[1]"); }), "");
-    EXPECT_EQ(Printed([] { ResolveObject(Kind::stmt, "s[1]"); }), "Handle s[1] not found\n");
-    Release(Kind::lob, "one");
 }
 
 }  // namespace

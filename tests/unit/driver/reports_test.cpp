@@ -1,10 +1,8 @@
-// Trace lines, diagnostic texts, the command table and lookup, against texts written down by hand.
+// Trace lines, the command table and lookup, against texts written down by hand.
 #include <unistd.h>
 
 #include "core/command_table.h"
-#include "core/state.h"
 #include "support/printed.h"
-#include "report/diagnostics.h"
 #include "report/trace.h"
 
 namespace {
@@ -42,24 +40,6 @@ TEST(CommandsDeathTest, AHandlerTableHasOnePlaceForEachCommand) {
     };
     EXPECT_DEATH(add(kTwice), "Command code 219 has two handlers: second");
     EXPECT_DEATH(add(kNoCommand), "Command code 453 is no command's: beyond");
-}
-
-TEST(Diagnostics, TheServerTagIsTheSameForEveryServer) {
-    const std::string longest(1100, 'x');
-    const struct { std::string text, shown; } cases[] = {
-        {"[KELP/SQLITE] ORA-00942: no such table", "[KELP/OKRA64] ORA-00942: no such table"},
-        {"a [AS/400] b", "a [KELP/OKRA64] b"}, {"[PLOVR/VM]", "[KELP/OKRA64]"}, {"[AS][KELP/X]!", "[AS][KELP/OKRA64]!"},
-        {"]] [KELP", "]] [KELP"}, {"[KELP and no bracket", "[KELP and no bracket"}, {"[kelp] plain", "[kelp] plain"},
-        {"", ""}, {"one\r\n", "one\n"}, {"one\r\ntwo\r\n", "one\nttwo\r\n"}, {"one\rtwo\n", "one\rtwo\n"},
-        {"[AS]" + longest, "[KELP/OKRA64]" + longest.substr(0, 1011)}};
-    for (const auto& c : cases) EXPECT_EQ(NormaliseDiagnostic(c.text), c.shown) << c.text;
-    const std::u16string wide(2000, u'x');
-    std::string text;
-    application_code_page = second_code_page = 1208;
-    Utf16Mode = true;
-    EXPECT_TRUE(ReadDiagnostic(reinterpret_cast<const char*>(wide.data()), 2 * wide.size(), text));
-    Utf16Mode = false;
-    EXPECT_EQ(text, std::string(1024, 'x'));
 }
 
 }  // namespace

@@ -40,18 +40,6 @@ struct Element {
     std::string Bytes(size_t count) const { return {reinterpret_cast<const char*>(data), count}; }
 };
 
-TEST(Values, NullSetsTheIndicatorOnly) {
-    Element element(SQLT_INT, 4);
-    EXPECT_EQ(element.Assign("Null", 4), "");
-    EXPECT_EQ(element.indicator, -1);
-    EXPECT_EQ(element.length, 0);
-    EXPECT_EQ(element.Bytes(4), "\xEE\xEE\xEE\xEE");
-    EXPECT_EQ(element.Show(), "\n");
-    element.return_code = 1405;
-    EXPECT_EQ(element.Assign("7", 1), "");
-    EXPECT_EQ(element.return_code, 0) << "of a value that was fetched before";
-}
-
 TEST(Values, BlanksInUtf16) {
     Element element(SQLT_AFC, 8);
     application_code_page = second_code_page = 1208;
