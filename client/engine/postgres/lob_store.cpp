@@ -170,6 +170,7 @@ Status ColumnLob::ReadWindow(std::uint64_t offset, std::size_t wanted) {
 Status ColumnLob::Draft(Lob*& draft) {
     draft = Store().FindDraft(*row_, *column_);
     if (draft) return {};
+    Store().Follow(row_, version_, Store().MakeRoom(*row_));    // later ones may be undone
     auto made = std::make_shared<TemporaryLob>(Kind(), Store().file_);
     Store().drafts_.reserve(Store().drafts_.size() + 1);
     if (Status status = CopyBytes(*this, 0, *made, 0, length_); status.Failed()) return status;
