@@ -27,17 +27,6 @@ std::string Parse(std::string_view text, std::string_view model, const char* lan
     return {engine_text, ToEngineText(value, engine_text)};
 }
 
-TEST(DateToText, SaysHowMuchRoomItTakes) {
-    char text[9] = "????????";
-    std::size_t length = 0;
-    const DateTime value = Read("2024-03-09");
-    EXPECT_EQ(ToText(value, "YYYY-MM-DD", kEnglish, Scope::date, text, 4, &length), 22059);
-    EXPECT_EQ(length, 10u);
-    EXPECT_STREQ(text, "2024????");
-    EXPECT_EQ(ToText(value, "YYYYMMDD", kEnglish, Scope::date, text, 8, &length), 0);
-    EXPECT_STREQ(text, "20240309");
-}
-
 TEST(DateFromText, MissingFieldsAreOfToday) {
     DateTime now, value;
     ASSERT_EQ(Now(&now), 0);

@@ -30,15 +30,6 @@ TEST(Zone, RegionsNameTheirSeasons) {
     EXPECT_EQ(SetZone(std::string(100000, 'x'), &value), 1882);
 }
 
-TEST(Zone, SeesAMomentElsewhere) {
-    DateTime moved;
-    ASSERT_EQ(ToOffset(Read("2024-01-01 00:30:00 +05:30"), -480, &moved), 0);
-    char text[kMaxEngineText];
-    EXPECT_EQ(std::string(text, ToEngineText(moved, text)), "2023-12-31 11:00:00 -08:00");
-    EXPECT_EQ(ToOffset(Read("9999-12-31 23:30:00 +00:00"), 60, &moved), 1841);
-    EXPECT_EQ(ToOffset(Read("-4712-01-01 00:30:00 +01:00"), 0, &moved), 1841);
-}
-
 TEST(Zone, TheClockIsThatOfTheProcess) {
     DateTime now;
     timespec before{}, after{};

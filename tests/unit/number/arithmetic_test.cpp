@@ -1,10 +1,7 @@
 // Arithmetic on numbers, against exact fractions.
 #include <gtest/gtest.h>
 
-#include <cmath>
-
 #include "number/add_wide.h"
-#include "number/format.h"
 #include "reference.h"
 
 namespace {
@@ -37,13 +34,6 @@ void NextToTie(RandomNumbers& numbers, OCINumber* a, OCINumber* b) {
     char text[45];
     *b = Number(mpz_get_str(text, 10, product));
     mpz_clears(inverse, product, power, nullptr);
-}
-
-// *value = the whole number next to it toward zero.
-void CutToWhole(Fraction& value) {
-    mpz_tdiv_q(mpq_numref(static_cast<mpq_ptr>(value)), mpq_numref(static_cast<mpq_ptr>(value)),
-               mpq_denref(static_cast<mpq_ptr>(value)));
-    mpz_set_ui(mpq_denref(static_cast<mpq_ptr>(value)), 1);
 }
 
 }  // namespace
@@ -94,68 +84,5 @@ TEST(NumberArithmetic, TheTwoWaysOfAddingAgree) {
         if (narrow_error) continue;
         ASSERT_EQ(number::AddWide(operands[0], operands[1], &operands[0]), 0);
         ASSERT_EQ(operands[0], narrow) << "into the first operand";
-    }
-}
-
-TEST(NumberArithmetic, RemainderIsExactAndHasTheSignOfTheFirst) {
-    RandomNumbers numbers(2);
-    for (int i = 0; i < 2000; ++i) {
-        const OCINumber a = numbers.Next(i % 2 ? 62 : 10), b = numbers.Next(i % 2 ? 62 : 10);
-        Fraction left(a), right(b), quotient, exact;
-        mpq_div(quotient, left, right);
-        CutToWhole(quotient);
-        mpq_mul(quotient, quotient, right);
-        mpq_sub(exact, left, quotient);
-        OCINumber got;
-        ASSERT_NO_FATAL_FAILURE(ExpectRounded("mod", number::Mod(a, b, &got), got, exact, Shown(a) + " " + Shown(b)));
-    }
-}
-
-TEST(NumberArithmetic, RoundingAndCuttingAtAnyPlace) {
-    RandomNumbers numbers(3);
-    for (int i = 0; i < 4000; ++i) {
-        const OCINumber a = numbers.Next(i % 3 ? 10 : 62);
-        const int places = numbers.Below(60) - 30;
-        Fraction scale(Number("1")), half(Number("0.5")), scaled(a), rounded;
-        for (int power = 0; power < (places < 0 ? -places : places); ++power)
-            mpz_mul_ui(mpq_numref(static_cast<mpq_ptr>(scale)), mpq_numref(static_cast<mpq_ptr>(scale)), 10);
-        if (places < 0) mpq_inv(scale, scale);
-        mpq_mul(scaled, scaled, scale);
-        if (mpq_sgn(static_cast<mpq_ptr>(scaled)) < 0)
-            mpq_sub(rounded, scaled, half);
-        else
-            mpq_add(rounded, scaled, half);
-        CutToWhole(rounded);
-        CutToWhole(scaled);
-        mpq_div(rounded, rounded, scale);
-        mpq_div(scaled, scaled, scale);
-        const std::string shown = Shown(a) + " at " + std::to_string(places);
-        OCINumber got;
-        ASSERT_NO_FATAL_FAILURE(ExpectRounded("round", number::Round(a, places, &got), got, rounded, shown));
-        ASSERT_NO_FATAL_FAILURE(ExpectRounded("trunc", number::Trunc(a, places, &got), got, scaled, shown));
-        Fraction moved(a);
-        for (int power = 0; power < places; ++power) mpq_mul(moved, moved, Fraction(Number("10")));
-        for (int power = 0; power > places; --power) mpq_div(moved, moved, Fraction(Number("10")));
-        ASSERT_NO_FATAL_FAILURE(ExpectRounded("shift", number::Shift(a, places, &got), got, moved, shown));
-    }
-}
-
-TEST(NumberArithmetic, SquareRootOfASquareAndBetweenNeighbours) {
-    RandomNumbers numbers(4);
-    for (int i = 0; i < 2000; ++i) {
-        OCINumber a = numbers.Next(i % 2 ? 60 : 5), root;
-        ASSERT_EQ(number::Abs(a, &a), 0);
-        ASSERT_EQ(number::Sqrt(a, &root), 0);
-        // root is right when (root - half a unit)^2 <= a < (root + half a unit)^2.
-        OCINumber unit{{2, root.OCINumberPart[1], 2}}, half_unit;
-        ASSERT_EQ(number::Shift(unit, -38, &unit), 0);
-        ASSERT_EQ(number::Div(unit, Number("2"), &half_unit), 0);
-        Fraction low(root), high(root), half(half_unit), value(a);
-        mpq_sub(low, low, half);
-        mpq_add(high, high, half);
-        mpq_mul(low, low, low);
-        mpq_mul(high, high, high);
-        ASSERT_LE(mpq_cmp(low, value), 0) << Shown(a);
-        ASSERT_LT(mpq_cmp(value, high), 0) << Shown(a);
     }
 }

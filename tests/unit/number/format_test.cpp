@@ -1,4 +1,4 @@
-// Numbers to and from text by a model.
+// Numbers to and from texts longer than most.
 #include "number/format.h"
 
 #include <gtest/gtest.h>
@@ -6,14 +6,6 @@
 #include "reference.h"
 
 namespace {
-
-// The text, or the error's number.
-std::string Formatted(std::string_view literal, std::string_view model) {
-    char text[200];
-    std::size_t length = 0;
-    const number::Errno error = number::ToText(Number(literal), model, {}, text, sizeof text, &length);
-    return error ? std::to_string(error) : std::string(text, length);
-}
 
 // The plain text of the number, or the error's number.
 std::string Parsed(std::string_view text, std::string_view model) {
@@ -33,15 +25,12 @@ TEST(NumberFormats, LongModelsAndTexts) {
     EXPECT_EQ(Parsed("1" + std::string(99, '0'), std::string(100, '9')), "1E+99");
 }
 
-TEST(NumberFromText, WhatToTextWroteComesBack) {
-    RandomNumbers numbers(31);
-    for (const char* model : {"9999.99", "0999.90", "$9,999.99", "S9999.99", "9999.99S", "9999.99MI", "9999.99PR",
-                              "FM9999.99", "L9999.99", "9G999D99", "FM$0,999.09PR", "B9999.90"}) {
-        for (int i = 0; i < 100; ++i) {
-            OCINumber value = numbers.Next(0), wanted;
-            ASSERT_EQ(number::Round(value, 2, &wanted), 0);
-            const std::string text = Formatted(Shown(value), model);
-            EXPECT_EQ(Parsed(text, model), Shown(wanted)) << "'" << text << "' by " << model;
-        }
-    }
+TEST(NumberPlainText, LongTextsAndOtherPoints) {
+    OCINumber got;
+    ASSERT_EQ(number::FromPlainText("0." + std::string(9000, '0') + "1", '.', &got), 0);
+    EXPECT_EQ(got, Number("0"));
+    EXPECT_EQ(number::FromPlainText(std::string(9000, '7'), '.', &got), 1426);
+    EXPECT_EQ(number::FromPlainText("", '.', &got), 1722);
+    ASSERT_EQ(number::FromPlainText("1,5", ',', &got), 0);
+    EXPECT_EQ(got, Number("1.5"));
 }

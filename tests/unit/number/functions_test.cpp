@@ -153,23 +153,6 @@ TEST(NumberFunctions, FunctionsOfTwoNumbers) {
     }
 }
 
-// The nearer the base is to 1, the more digits of it count: 1.0...0d to the power of 10^n.
-TEST(NumberFunctions, PowersOfBasesNextToOne) {
-    for (const char* digit : {"1", "7", "-3", "-9"}) {
-        for (int zeros = 1; zeros <= 38; ++zeros) {
-            for (int power = zeros - 1; power <= zeros + 2; ++power) {
-                OCINumber base = Number(std::string(digit) + "E-" + std::to_string(zeros)), got;
-                ASSERT_EQ(number::Add(base, Number("1"), &base), 0);
-                const OCINumber exponent = Number("1.2345E" + std::to_string(power));
-                Reference base_real(base), exponent_real(exponent), result;
-                result.Set([&](mpfr_ptr real) { mpfr_pow(real, base_real, exponent_real, MPFR_RNDN); });
-                ASSERT_NO_FATAL_FAILURE(result.Expect("power", number::Power(base, exponent, &got), got,
-                                                      Shown(base) + " " + Shown(exponent)));
-            }
-        }
-    }
-}
-
 TEST(NumberFunctions, FromSeveralThreads) {
     OCINumber wanted;
     ASSERT_EQ(number::Sin(Number("2"), &wanted), 0);

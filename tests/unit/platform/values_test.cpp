@@ -1,9 +1,7 @@
-// Packed decimal, numbers from text, tagged memory, message texts.
+// Packed decimal, tagged memory, message texts.
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-#include <cstdio>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -14,22 +12,9 @@
 #include "platform/memory.h"
 #include "platform/message_catalogue.h"
 #include "platform/message_texts.h"
-#include "platform/numbers.h"
 #include "platform/packed_decimal.h"
 
 namespace {
-
-using namespace std::string_literals;
-
-TEST(PackedDecimal, FromTextTellsWhatIsWrong) {
-    const struct { const char* text; int result; } cases[] = {{"1000", kDecimalOverflow}, {"999.995", kDecimalOverflow},
-        {"", kDecimalBadText}, {"12x", kDecimalBadText}, {nullptr, kDecimalBadText}};
-    for (const auto& c : cases) {
-        unsigned char packed[3] = {1, 2, 3};
-        EXPECT_EQ(TextToDecimal(c.text, packed, 5, 2), c.result) << (c.text ? c.text : "null");
-        EXPECT_EQ(packed[0], 1);
-    }
-}
 
 TEST(PackedDecimal, ToTextOfEveryCapacity) {
     const std::string whole = "-123.45";
@@ -40,18 +25,6 @@ TEST(PackedDecimal, ToTextOfEveryCapacity) {
         EXPECT_EQ(result, capacity > whole.size() ? kDecimalDone : kDecimalTooShort) << capacity;
         const std::string text = capacity == 0 ? "" : area.data();
         EXPECT_EQ(text, whole.substr(0, capacity == 0 ? 0 : capacity - 1));
-    }
-}
-
-TEST(Numbers, RulesOfAtoiAndBeyondTheRange) {
-    const struct { const char* text; std::int64_t i; std::uint64_t u; } cases[] = {
-        {"42", 42, 42}, {" \t-7x", -7, 0xFFFFFFFFFFFFFFF9}, {"+3", 3, 3}, {"x", 0, 0}, {"", 0, 0}, {nullptr, 0, 0},
-        {"0x10", 0, 0}, {"010", 10, 10}, {"2147483648", 2147483648, 2147483648},
-        {"-2147483649", -2147483649, 0xFFFFFFFF7FFFFFFF}, {"18446744073709551615", INT64_MAX, UINT64_MAX},
-        {"99999999999999999999", INT64_MAX, UINT64_MAX}, {"-99999999999999999999", INT64_MIN, UINT64_MAX}};
-    for (const auto& c : cases) {
-        EXPECT_EQ(StrToInt64(c.text), c.i) << (c.text ? c.text : "null");
-        EXPECT_EQ(StrToUint64(c.text), c.u) << (c.text ? c.text : "null");
     }
 }
 
@@ -142,35 +115,6 @@ TEST(MessageTexts, OfADamagedCatalogue) {
         EXPECT_TRUE(text.empty() || whole.find(text) != whole.npos) << place;
     }
     std::filesystem::remove(path);
-}
-
-std::string Hex(const void* bytes, std::size_t size) {
-    std::string hex;
-    for (std::size_t index = 0; index < size; ++index) {
-        char pair[3];
-        std::snprintf(pair, sizeof pair, "%02X", static_cast<const unsigned char*>(bytes)[index]);
-        hex += pair;
-    }
-    return hex;
-}
-
-TEST(PackedDecimal, DigitsOfTheBytes) {
-    const struct { std::string packed; std::size_t room; int result; bool negative; const char* digits; } cases[] = {
-        {"\x12\x34\x5D", 5, kDecimalDone, true, "12345"}, {"\x12\x34\x5B", 5, kDecimalDone, true, "12345"},
-        {"\x12\x34\x5C", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5A", 5, kDecimalDone, false, "12345"},
-        {"\x12\x34\x5E", 5, kDecimalDone, false, "12345"}, {"\x12\x34\x5F", 5, kDecimalDone, false, "12345"},
-        {"\x00\x00\x7C"s, 1, kDecimalDone, false, "7"}, {"\x00\x0D"s, 1, kDecimalDone, true, ""},
-        {"\x12\x34\x5C", 4, kDecimalTooShort, false, "1234"}, {"\x12\x34\x59", 5, kDecimalBadSign, false, ""},
-        {"\x1A\x34\x5C", 5, kDecimalBadDigit, false, "1"}};
-    for (const auto& c : cases) {
-        char digits[16] = {};
-        bool negative = false;
-        std::size_t count = 99;
-        EXPECT_EQ(ReadPackedDecimal(c.packed.data(), c.packed.size(), &negative, digits, c.room, &count), c.result)
-            << Hex(c.packed.data(), c.packed.size());
-        EXPECT_EQ(std::string(digits, count), c.digits) << Hex(c.packed.data(), c.packed.size());
-        EXPECT_EQ(negative, c.negative) << Hex(c.packed.data(), c.packed.size());
-    }
 }
 
 }  // namespace

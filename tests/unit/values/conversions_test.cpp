@@ -50,42 +50,6 @@ protected:
     sb2 indicator_ = 0;
 };
 
-TEST_F(Conversions, Dates) {
-    MustRun("create table d(d date, s timestamp, v varchar2(30), z timestamp with time zone)",
-            "insert into d values(date '2024-02-29', timestamp '2024-02-29 13:05:00.25', '29-FEB-24', "
-            "'2024-02-29 13:05:00.25 +02:00')");
-    EXPECT_EQ(One("select d from d"), "29-FEB-24");
-    EXPECT_EQ(One("select s from d"), "29-FEB-24 01.05.00.250000 PM");
-    char returned[2][40] = {};
-    ASSERT_EQ(Ready("update d set v = v returning s, d into :1, :2", {Text(returned[0]), Text(returned[1])}) + Execute(), 0);
-    EXPECT_EQ(std::string(returned[0]) + returned[1], "29-FEB-24 01.05.00.250000 PM29-FEB-24");
-    if (!OnServer()) {    // which keeps the moment alone
-        EXPECT_EQ(One("select z from d"), "29-FEB-24 01.05.00.250000 PM +02:00");
-    }
-    const std::string day = Raw<ub1>(120) + Raw<ub1>(124) + "\x02\x1D\x01\x01\x01";
-    const auto fetch = [&](const char* column, ub2 type, sb4 size) {
-        std::string area(static_cast<std::size_t>(size), '\0');
-        const sb4 answer = Query(std::string("select ") + column + " from d", {{area.data(), size, type}});
-        return answer == 0 ? Hex(area) : "!" + std::to_string(answer);
-    };
-    const struct { const char* column; std::string seen; } cases[] = {
-        {"d", Hex(day)}, {"v" /* text in the default model */, Hex(day)}, {"s", Hex(day.substr(0, 4) + "\x0E\x06\x01")},
-        {"1", "!932"}, {"'31-FEB-24'", "!1839"}};
-    for (const auto& c : cases) EXPECT_EQ(fetch(c.column, SQLT_DAT, 7), c.seen) << c.column;
-    EXPECT_EQ(fetch("'no date'", SQLT_ODT, 8), "!1858");
-    const OCIDate oci{2024, 2, 29, {0, 0, 0}};
-    EXPECT_EQ(fetch("d", SQLT_ODT, 8).substr(0, 14), Hex(Raw(oci)).substr(0, 14));
-
-    EXPECT_EQ(In(day, SQLT_DAT), "'2024-02-29 00:00:00'");
-    EXPECT_EQ(In(Raw(OCIDate{2024, 2, 29, {13, 5, 9}}), SQLT_ODT), "'2024-02-29 13:05:09'");
-    EXPECT_EQ(In(Raw(OCIDate{2024, 2, 30, {0, 0, 0}}), SQLT_ODT), "!1839");
-    EXPECT_EQ(In(std::string(7, '\0'), SQLT_DAT), "!1841");
-    OCIDate old{-44, 3, 15, {0, 0, 0}};
-    MustRun("delete from d");
-    MUST(Ready("insert into d(d) values(:1)", {{&old, sizeof old, SQLT_ODT}}), Execute());
-    EXPECT_EQ(One("select d from d"), "15-MAR-44");
-}
-
 TEST_F(Conversions, DatetimeDescriptors) {
     auto* datetime = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
     const std::string element = Raw(datetime);
