@@ -22,22 +22,6 @@ Tokenized Split(const std::string& line) {
     return result;
 }
 
-TEST(Tokenizer, SplitsALine) {
-    const struct { const char* line; Words words; } cases[] = {
-        {"OCIStmtPrepare stmt err \"select 1 from dual\"\n", {"OCIStmtPrepare", "stmt", "err", "select 1 from dual"}},
-        {"opt PRINTSQLFUNCTIONCODE#note\n", {"opt", "PRINTSQLFUNCTIONCODE"}}, {"a \"b c\"d e\n", {"a", "b c", "e"}},
-        {"a \"b # c\" d\n", {"a", "b # c", "d"}}, {"a \"b\"#c d\n", {"a", "b"}}, {"a \"b\"c#d e\n", {"a", "b"}},
-        {"\"\"\n", {""}}, {" \t a \t b \t\n", {"a", "b"}}, {"a b # c\n", {"a", "b"}}, {"a b\r\n", {"a", "b"}},
-        {"a\vb\n", {"a", "b"}}, {"a \v b\n", {"a", "", "b"}}, {"ab\"c d\"e\n", {"ab\"c", "d\"e"}},
-        {"no line end", {"no", "line", "end"}}, {"\xff\x80\x01 \xc3\xa4\n", {"\xff\x80\x01", "\xc3\xa4"}},
-        {"a \"\" b\n", {"a", "", "b"}}};
-    for (const auto& c : cases) {
-        const Tokenized result = Split(c.line);
-        EXPECT_EQ(result.words, c.words) << c.line;
-        EXPECT_EQ(result.printed, "") << c.line;
-    }
-}
-
 TEST(Tokenizer, ALineThatFillsTheBuffer) {
     const std::string word(kLineSize - 1, 'x');
     EXPECT_EQ(Split(word).words, Words{word});
