@@ -68,10 +68,4 @@ TEST(Utf, WhatIsShownReplacesEachMalformedByte) {
     EXPECT_EQ(out, Units(u"a\uFFFD\uFFFD\uFFFDz"));
 }
 
-TEST(Utf, NoCharacterIsTorn) {
-    const std::string utf8 = "\xC3\xA4\xF0\x9F\x98\x80z";  // of 2, 4 and 1 bytes
-    const size_t whole8[] = {0, 0, 2, 2, 2, 2, 6, 7, 7};
-    for (size_t room = 0; room < std::size(whole8); ++room) EXPECT_EQ(utf::WholeUtf8(utf8, room), whole8[room]) << room;
-}
-
 }  // namespace

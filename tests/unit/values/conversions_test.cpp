@@ -82,48 +82,14 @@ TEST_F(Conversions, ATimeAloneIsNoDate) {
     EXPECT_EQ(One("select cast('10:20:30' as timestamp) from dual"), OnServer() ? "!1861" : "!932");
 }
 
-TEST_F(Conversions, Intervals) {
+// With either engine: descriptors and texts in and out, of columns and of expressions; the other span is refused.
+TEST_F(Conversions, IntervalColumns) {
     auto* months = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
     auto* days = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_DS), "!1867") << "never set";
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_YM), "!932") << "the other span";
     EXPECT_EQ(In(Raw(stmt), SQLT_INTERVAL_YM), "!21710");
-    MustRun("create table spans(ym interval year(3) to month, ds interval day(4) to second(3), v varchar2(40))");
-    const auto from_text = [&](OCIInterval* place, std::string_view text) {
-        EXPECT_EQ(Answer(OCIIntervalFromText(env, err, Bytes(text), text.size(), place)), 0) << text;
-    };
-    // Out of descriptors into columns of intervals and of texts, and back. Nothing is lost but digits of the fraction.
-    const struct { const char *ym, *ds, *seen; } cases[] = {
-        {"1-2", "1 2:03:04.5", "+001-02 +0001 02:03:04.500 +01 02:03:04.500000"},
-        {"-120-11", "-9999 23:59:59.9994999", "-120-11 -9999 23:59:59.999 -9999 23:59:59.999499900"},
-        {"0-0", "0 0:0:0", "+000-00 +0000 00:00:00.000 +00 00:00:00.000000"}};
-    for (const auto& c : cases) {
-        from_text(months, c.ym);
-        from_text(days, c.ds);
-        ASSERT_EQ(Ready("insert into spans values(:1, :2, :3)", {{&months, 8, SQLT_INTERVAL_YM}, {&days, 8, SQLT_INTERVAL_DS},
-                                                                {&days, 8, SQLT_INTERVAL_DS}}), 0);
-        EXPECT_EQ(Execute(), 0);
-        char texts[3][41] = {};
-        ASSERT_EQ(Query("select ym, ds, v from spans", {Text(texts[0]), Text(texts[1]), Text(texts[2])}), 0);
-        EXPECT_EQ(std::string(texts[0]) + " " + texts[1] + " " + texts[2], c.seen);
-        EXPECT_EQ(Attribute<ub2>(OCI_ATTR_DATA_TYPE, Column(1), OCI_DTYPE_PARAM), SQLT_INTERVAL_YM);
-        EXPECT_EQ(Attribute<ub1>(OCI_ATTR_LFPRECISION, Column(2), OCI_DTYPE_PARAM), 4);
-        EXPECT_EQ(Attribute<ub1>(OCI_ATTR_FSPRECISION, Column(2), OCI_DTYPE_PARAM), 3);
-        auto* back = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
-        sword order = 9;
-        ASSERT_EQ(Query("select v from spans", {{&back, 8, SQLT_INTERVAL_DS}}), 0);
-        EXPECT_EQ(Answer(OCIIntervalCompare(env, err, days, back, &order)), 0);
-        EXPECT_EQ(order, 0);
-        EXPECT_EQ(Query("select ym from spans", {{&back, 8, SQLT_INTERVAL_DS}}), 1867) << c.ym;
-        MustRun("delete from spans");
-    }
     EXPECT_EQ(Query("select '1 0:0:0' from dual", {{&stmt, 8, SQLT_INTERVAL_DS}}), 21710);
-}
-
-// With either engine: descriptors and texts in and out, of columns and of expressions; the other span is refused.
-TEST_F(Conversions, IntervalColumns) {
-    auto* months = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
-    auto* days = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     MustRun("create table spans(ym interval year to month, ds interval day to second, n number)");
     const struct { const char *ym, *ds; } cases[] = {
         {"+01-02", "+01 02:03:04.500000"}, {"-99-11", "-99 23:59:59.999499"}, {"+00-00", "+00 00:00:00.000000"}};
