@@ -1,5 +1,5 @@
 // Pools: what a full pool answers, what ends do, and many threads at once. Refusals and tags stand in
-// transcripts/pool_states.
+// transcripts/walk_pools.
 #include <atomic>
 #include <chrono>
 #include <mutex>
