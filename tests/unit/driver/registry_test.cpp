@@ -1,5 +1,4 @@
-// The tables of named objects: capacities and messages written down by hand.
-#include "objects/areas.h"
+// The tables of named objects, but for areas: capacities and messages written down by hand.
 #include "objects/buffers.h"
 #include "objects/registry.h"
 #include "support/printed.h"
@@ -36,38 +35,6 @@ TEST(Registry, CapacitiesAndMessages) {
     static MemBuffer slots[2];
     EXPECT_EQ(Printed([] { while (OccupySlot(Kind::buffer, std::span<MemBuffer>(slots), "b") != nullptr) {} }),
               "Reached max buffer handle count - 256\n");
-}
-
-Cda_Def* EnterArea(Kind kind, const std::string& name, Lda_Def* parent = nullptr) {
-    NewArea area(kind, name.c_str());
-    if (!area.Make()) return nullptr;
-    Cda_Def* const made = area.Area();
-    area.Enter(parent);
-    return made;
-}
-
-TEST(Registry, AreasStayWhereTheyAreUntilTheyAreReleased) {
-    Cda_Def* cursor = nullptr;
-    for (const auto& pair : {std::pair{Kind::cursor, "cursor"}, {Kind::ldainfo, "ldainfo"}}) {
-        const auto kind = pair.first;
-        const char* const word = pair.second;
-        for (int number = 0; number < 30; ++number) EnterArea(kind, "n" + std::to_string(number));
-        EXPECT_EQ(Printed([&] { EXPECT_NE(EnterArea(kind, "one more"), nullptr); }),
-                  std::string("Reached max ") + word + " count - 30\n");
-        EXPECT_EQ(FindSlot(Areas(kind), "one more"), nullptr) << word;
-    }
-    const AreaArgument login = ResolveArea(Kind::ldainfo, "n7");
-    EXPECT_EQ(Printed([] { EXPECT_EQ(EnterArea(Kind::ldainfo, "n7"), nullptr); }), "lda already in use\n");
-    EXPECT_EQ(Printed([&] { cursor = EnterArea(Kind::cursor, "n8", login.area); }), "");
-    const AreaArgument found = ResolveArea(Kind::cursor, "n8");
-    EXPECT_EQ(found.area, cursor);
-    EXPECT_EQ(found.slot->parent, login.area);
-    ReleaseArea(*login.slot);
-    EXPECT_TRUE(found.slot->in_use);
-    EXPECT_EQ(found.slot->parent, nullptr) << "its login is gone";
-    EXPECT_EQ(Printed([] { EXPECT_EQ(ResolveArea(Kind::ldainfo, "n7").area, nullptr); }), "Handle n7 not found\n");
-    for (const Kind kind : {Kind::cursor, Kind::ldainfo})
-        for (NamedArea& slot : Areas(kind)) if (slot.in_use) ReleaseArea(slot);
 }
 
 }  // namespace
