@@ -11,7 +11,7 @@
 
 #include "handles/character_set.h"
 #include "handles/error_handle.h"
-#include "handles/object.h"
+#include "handles/kept.h"
 #include "handles/status.h"
 
 // The application's memory functions; all null: the library's own.
@@ -51,6 +51,7 @@ public:
     void Release(void* memory) noexcept;    // null is harmless
     [[nodiscard]] std::uint64_t HeapBytes() const { return heap_bytes_.load(std::memory_order_relaxed); }
 
+    const Birth birth;
     ErrorList errors;    // the records of calls without an error handle
     std::atomic<const char*> last_call{nullptr};    // the name of the last of these; null: none yet
 

@@ -14,7 +14,7 @@
 
 #include "engine/engine.h"
 #include "handles/environment.h"
-#include "handles/object.h"
+#include "handles/kept.h"
 
 class Link;
 class Session;
@@ -60,6 +60,7 @@ public:
     void Leave(const Session& session) noexcept;
     [[nodiscard]] std::vector<std::shared_ptr<Link>> Links() const;
 
+    const Birth birth;
     std::string internal_name;
     std::string external_name;
     std::string group;

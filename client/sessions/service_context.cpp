@@ -94,18 +94,18 @@ Status ServiceContext::Require(std::shared_ptr<Link>& link) {
 
 Status ServiceContext::SetServer(Server* server) {
     if (logged_on_) return Error(errors::kReadOnly);
-    server_ = server;
+    server_.Set(server);
     return {};
 }
 
 Status ServiceContext::SetSession(Session* session) {
     if (logged_on_) return Error(errors::kReadOnly);
-    session_ = session;
+    session_.Set(session);
     return {};
 }
 
 Status ServiceContext::SetTransaction(TransactionHandle* transaction) {
-    transaction_ = transaction;
+    transaction_.Set(transaction);
     return {};
 }
 
@@ -133,8 +133,8 @@ Status ServiceContext::LogOn(const Target& target, const engine::Credentials& cr
         return status;
     }
     if (const std::shared_ptr<Link> link = session.ShareLink()) session.user = link->user;
-    server_ = &server;
-    session_ = &session;
+    server_.Set(&server);
+    session_.Set(&session);
     obtained_ = ended_by == EndedBy::release;
     logged_on_ = true;
     return status;
@@ -198,8 +198,8 @@ Status ServiceContext::TakeOver(ServiceContext& from) {
         (void)server.Detach();
         return status;
     }
-    server_ = &server;
-    session_ = &session;
+    server_.Set(&server);
+    session_.Set(&session);
     logged_on_ = true;
     (void)from.Forget();
     return {};
@@ -207,8 +207,8 @@ Status ServiceContext::TakeOver(ServiceContext& from) {
 
 Status ServiceContext::Forget() {
     statement_cache_size = 0;
-    server_ = nullptr;
-    session_ = nullptr;
+    server_.Set(nullptr);
+    session_.Set(nullptr);
     logged_on_ = false;
     obtained_ = false;
     return own_server_->Detach();

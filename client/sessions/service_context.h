@@ -14,7 +14,7 @@
 #include <string>
 #include <string_view>
 
-#include "handles/object.h"
+#include "handles/kept.h"
 #include "sessions/link.h"
 #include "sessions/server.h"
 #include "sessions/session.h"
@@ -36,9 +36,9 @@ public:
     Status RequireServer(Server*& server);
 
     // What the application set; null when it is freed meanwhile.
-    [[nodiscard]] Server* GetServer() const { return Live<Server>(server_); }
-    [[nodiscard]] Session* GetSession() const { return Live<Session>(session_); }
-    [[nodiscard]] TransactionHandle* GetTransaction() const { return Live<TransactionHandle>(transaction_); }
+    [[nodiscard]] Server* GetServer() const { return server_.Get(); }
+    [[nodiscard]] Session* GetSession() const { return session_.Get(); }
+    [[nodiscard]] TransactionHandle* GetTransaction() const { return transaction_.Get(); }
     Status SetServer(Server* server);       // refused (24309) on a context that is logged on by a logon call
     Status SetSession(Session* session);
     Status SetTransaction(TransactionHandle* transaction);
@@ -72,15 +72,16 @@ public:
     std::atomic<std::uint32_t> statement_cache_size{0};    // 0: no cache
 
     std::string tag;    // of the session that was got, as the application reads it
+    const Birth birth;
 
 private:
     Server& OwnServer();
     Status Forget();    // the session has ended
     Status EndFormer();    // before a logon
 
-    std::atomic<const void*> server_{nullptr};     // read from any thread
-    std::atomic<const void*> session_{nullptr};
-    std::atomic<const void*> transaction_{nullptr};
+    Kept<Server> server_;
+    Kept<Session> session_;
+    Kept<TransactionHandle> transaction_;
     std::atomic<bool> logged_on_{false};            // by a logon call: server and session are read-only
     std::atomic<bool> obtained_{false};
     std::atomic<bool> lent_{false};

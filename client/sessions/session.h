@@ -13,7 +13,7 @@
 
 #include "engine/engine.h"
 #include "handles/environment.h"
-#include "handles/object.h"
+#include "handles/kept.h"
 #include "sessions/link.h"
 
 class Server;
@@ -44,6 +44,7 @@ public:
     Status UseSchema(std::string schema);
     Status GetSchema(std::string& schema) const;    // that the application wants, else the engine's
 
+    const Birth birth;
     std::string user;
     std::string password;
     std::string client_identifier;

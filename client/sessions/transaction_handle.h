@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <string>
 
-#include "handles/object.h"
+#include "handles/kept.h"
 #include "handles/status.h"
 
 class TransactionHandle : public Object {
@@ -17,4 +17,5 @@ public:
     std::string xid = std::string(kXidSize, '\0');
     std::string name;
     std::uint32_t timeout = 0;
+    const Birth birth;
 };

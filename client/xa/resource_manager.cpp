@@ -51,8 +51,8 @@ ResourceManager::~ResourceManager() {
     if (Environment* const environment = GetEnvironment()) Destroy(environment);
 }
 
-Environment* ResourceManager::GetEnvironment() const { return Live<Environment>(environment_); }
-ServiceContext* ResourceManager::GetService() const { return Live<ServiceContext>(service_); }
+Environment* ResourceManager::GetEnvironment() const { return environment_.Get(); }
+ServiceContext* ResourceManager::GetService() const { return service_.Get(); }
 
 // Branches leave the session and come back with connections of their own: a database with one connection is refused.
 Answer ResourceManager::LogOn() {
@@ -60,9 +60,9 @@ Answer ResourceManager::LogOn() {
     const std::uint32_t mode = defaults.mode | OCI_THREADED;
     Environment* const environment = Environment::Open(mode, Environment::SetsOf(mode), defaults.memory, 0);
     if (!environment) return {XAER_RMERR, Error(errors::kOutOfMemory)};
-    environment_ = environment;
+    environment_.Set(environment);
     auto* const service = Create<ServiceContext>(*environment, OCI_HTYPE_SVCCTX, 0);
-    service_ = service;
+    service_.Set(service);
     if (Status status = service->LogOn({info_.server, {}}, info_.credentials, ServiceContext::EndedBy::logoff);
         !status.Ok())
         return {CodeOf(status.Number()), std::move(status)};

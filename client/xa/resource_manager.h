@@ -48,8 +48,8 @@ private:
     const int rmid_;
     const Info info_;
     const std::uint64_t thread_;    // 0: the process
-    const void* environment_ = nullptr;
-    const void* service_ = nullptr;
+    Kept<Environment> environment_;
+    Kept<ServiceContext> service_;
 };
 using ManagerPointer = std::shared_ptr<ResourceManager>;
 

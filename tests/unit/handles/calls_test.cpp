@@ -1,5 +1,9 @@
 // The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good
 // arguments, with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
+#include <array>
+#include <cstdlib>
+#include <map>
+#include <utility>
 #include <vector>
 
 #include "support/at_once.h"
@@ -227,6 +231,49 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, OwnMemory::Allocate, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
     EXPECT_EQ(memory.out, 0) << "one function alone is none";
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
+}
+
+// Gives freed blocks out again, the last one first.
+struct SameMemory {
+    std::map<size_t, std::vector<dvoid*>> freed;
+    std::map<dvoid*, size_t> sizes;
+    ~SameMemory() {
+        for (const auto& [block, size] : sizes) std::free(block);
+    }
+    static dvoid* Allocate(dvoid* context, size_t size) {
+        auto& self = *static_cast<SameMemory*>(context);
+        auto& again = self.freed[size];
+        dvoid* const block = again.empty() ? std::malloc(size) : again.back();
+        if (!again.empty()) again.pop_back();
+        self.sizes[block] = size;
+        return block;
+    }
+    static dvoid* Reallocate(dvoid*, dvoid*, size_t) { return nullptr; }
+    static void Free(dvoid* context, dvoid* block) {
+        auto& self = *static_cast<SameMemory*>(context);
+        self.freed[self.sizes[block]].push_back(block);
+    }
+};
+
+// What a context was put together from is not what lies there later.
+TEST_F(CallsTest, AHandleWhereAnotherOneWas) {
+    SameMemory memory;
+    OCIEnv* env = nullptr;
+    ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, SameMemory::Allocate, SameMemory::Reallocate, SameMemory::Free, 0, nullptr), 0);
+    dvoid* service = nullptr;
+    ASSERT_EQ(OCIHandleAlloc(env, &service, OCI_HTYPE_SVCCTX, 0, nullptr), 0);
+    constexpr std::array<std::pair<ub4, ub4>, 3> parts{{{OCI_HTYPE_SERVER, OCI_ATTR_SERVER}, {OCI_HTYPE_SESSION, OCI_ATTR_SESSION},
+                                                        {OCI_HTYPE_TRANS, OCI_ATTR_TRANS}}};
+    for (const auto& [type, attribute] : parts) {
+        dvoid *former = nullptr, *next = nullptr;
+        ASSERT_EQ(OCIHandleAlloc(env, &former, type, 0, nullptr), 0);
+        ASSERT_EQ(OCIAttrSet(service, OCI_HTYPE_SVCCTX, former, 0, attribute, err_), 0);
+        EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), former);
+        ASSERT_EQ(OCIHandleFree(former, type) + OCIHandleAlloc(env, &next, type, 0, nullptr), 0);
+        ASSERT_EQ(next, former) << "else this test tests nothing";
+        EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), nullptr) << type;
+    }
+    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
 }
 
 // Handles come and go in many threads while others are looked up: growth of the set of living objects included.
