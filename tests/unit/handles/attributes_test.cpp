@@ -1,5 +1,5 @@
 // Every number that is an attribute of something, over every kind of handle: what can be read, in which width, what can
-// be set and read back, and 24315 for everything else. What applications may know of failover, too.
+// be set and read back, and 24315 for everything else.
 #include <map>
 
 #include "support/call_fixture.h"
@@ -43,7 +43,7 @@ protected:
         stmt_ = New<OCIStmt>(OCI_HTYPE_STMT);
         for (const char* sql : {"create table t(a number(5,2) not null, b timestamp(3), c nvarchar2(7))",
                                 "create view v as select a from t", "insert into t values(1, null, 'x')"}) {
-            ASSERT_EQ(Run(sql, 1), 0) << sql;
+            ASSERT_EQ(Run(svc_, sql), 0) << sql;
         }
     }
     void TearDown() override {
@@ -51,12 +51,6 @@ protected:
         CallFixture::TearDown();
     }
     [[nodiscard]] const char* Database() const { return OnServer() ? "work" : ":memory:"; }
-    [[nodiscard]] const char* Schema() const { return OnServer() ? "public" : "main"; }
-    sb4 Run(const char* sql, ub4 iterations, ub4 mode = OCI_DEFAULT) {
-        const sword code = OCIStmtPrepare(stmt_, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
-        if (code != OCI_SUCCESS) return Answer(code);
-        return Answer(OCIStmtExecute(svc_, stmt_, err_, iterations, 0, nullptr, nullptr, mode));
-    }
     sb4 Describe(OCIDescribe* describe, const char* name, ub1 type, ub1 pointer = OCI_OTYPE_NAME, ub1 level = 0) {
         return Answer(OCIDescribeAny(svc_, err_, Text(name), Length(name), pointer, level, type, describe));
     }
@@ -190,26 +184,11 @@ TEST_F(AttributesTest, EveryNumberOverEveryKind) {
     }
 }
 
-TEST_F(AttributesTest, ValuesThatAreRefused) {
-    const std::map<char, Handle> handles = OneOfEach();
-    static ub4 integer = 0;
-    const struct { char kind; ub4 attribute; ub4 integer; sb4 answer; } cases[] = {
-        {'b', OCI_ATTR_PDSCL, 127, 0}, {'b', OCI_ATTR_PDSCL, 128, 24328}, {'d', OCI_ATTR_PDSCL, 0xFFAC, 0},
-        {'d', OCI_ATTR_PDSCL, 0xFFAB, 24328}, {'b', OCI_ATTR_PDPRC, 40, 0}, {'b', OCI_ATTR_PDPRC, 41, 24328},
-        {'b', OCI_ATTR_CHARSET_FORM, 2, 0}, {'b', OCI_ATTR_CHARSET_FORM, 3, 24328},
-        {'d', OCI_ATTR_CHARSET_FORM, 0, 24328}, {'d', OCI_ATTR_CHARSET_ID, 870, 24329}};
-    for (const auto& c : cases) {
-        const Handle& on = handles.at(c.kind);
-        integer = c.integer;
-        EXPECT_EQ(Set(on.pointer, on.type, c.attribute, &integer), c.answer) << c.attribute << " " << c.integer;
-    }
-}
-
 // Of dates and times numbers 16 and 17 mean something else, in one byte.
 TEST_F(AttributesTest, DigitsOfDatetimes) {
     OCIDefine* define = nullptr;
     static OCIDateTime* moment = nullptr;
-    ASSERT_EQ(Run("select b from t", 0), 0);
+    ASSERT_EQ(Run(svc_, stmt_, err_, "select b from t", 0), 0);
     ASSERT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &moment, 8, SQLT_TIMESTAMP, nullptr, nullptr, nullptr,
                                     OCI_DEFAULT)), 0);
     ub1 digits[2] = {3, 77};
@@ -219,25 +198,12 @@ TEST_F(AttributesTest, DigitsOfDatetimes) {
     }
     digits[0] = 10;
     EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, OCI_ATTR_FSPRECISION, digits), 24328);
-    dvoid *item = nullptr, *table = Described("t", OCI_PTYPE_TABLE);
-    ASSERT_EQ(Member(stmt_, &item, 1, OCI_HTYPE_STMT), 0);
-    for (dvoid* column : {item, Below(table, OCI_ATTR_LIST_COLUMNS, 2)}) {
-        EXPECT_EQ(Attribute<ub1>(column, OCI_DTYPE_PARAM, OCI_ATTR_FSPRECISION), 3);
-        EXPECT_EQ(Name(column, OCI_ATTR_LFPRECISION), "!24315");
-    }
-    ASSERT_EQ(Run("create table x(n integer primary key) without rowid", 1), 0);
-    for (const auto& [name, is_index] : {std::pair{"t", 0}, {"x", 1}})
-        EXPECT_EQ(Attribute<ub1>(Described(name, OCI_PTYPE_TABLE), OCI_DTYPE_PARAM, OCI_ATTR_INDEX_ONLY), is_index);
 }
 
-// Kept to itself: nothing fails over.
-sb4 NeverCalled(dvoid*, dvoid*, dvoid*, ub4, ub4) { return OCI_FO_RETRY; }
 static_assert(sizeof(utext) == 2 && UB4MAXVAL + 1 == UB4MINVAL && SB4MINVAL < SB4MAXVAL && SQLT_AFV == 97);
 static_assert(OCI_TYPECODE_BFLOAT == 100 && OCI_TYPECODE_BDOUBLE == 101 && OCI_FO_REAUTH == 4 && OCI_FO_TXNAL == 8);
 
-TEST_F(AttributesTest, MemoryAndFailover) {
-    OCIFocbkStruct failover{NeverCalled, nullptr};
-    EXPECT_EQ(Set(New<OCIServer>(OCI_HTYPE_SERVER), OCI_HTYPE_SERVER, OCI_ATTR_FOCBK, &failover), 0);
+TEST_F(AttributesTest, Memory) {
     const auto heap = [&] { return Attribute<ub4>(env_, OCI_HTYPE_ENV, OCI_ATTR_HEAPALLOC); };
     const ub4 before = heap();
     dvoid* handle = nullptr;
@@ -250,64 +216,25 @@ TEST_F(AttributesTest, MemoryAndFailover) {
 TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
     ASSERT_EQ(Describe(describe, "T", OCI_PTYPE_TABLE), 0);
-    dvoid *root = nullptr, *again = nullptr, *columns = nullptr;
-    EXPECT_EQ(Member(describe, &root, 0, OCI_HTYPE_DESCRIBE), 24334);
+    dvoid *root = nullptr, *again = nullptr;
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
-    EXPECT_EQ(Member(describe, nullptr, 1, OCI_HTYPE_DESCRIBE), 21560);
-    const std::int64_t blocks = [&] {
-        for (ub4 position = 1; position <= 3; ++position) again = Below(root, OCI_ATTR_LIST_COLUMNS, position);
-        return OCI_memGetMemCount();
-    }();
+    for (ub4 position = 1; position <= 3; ++position) again = Below(root, OCI_ATTR_LIST_COLUMNS, position);
+    const sb4 blocks = OCI_memGetMemCount();
     EXPECT_EQ(Below(root, OCI_ATTR_LIST_COLUMNS, 3), again) << "the same one when asked again";
     EXPECT_EQ(OCI_memGetMemCount(), blocks);
-    EXPECT_EQ(Attribute<ub1>(again, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_FORM), OnServer() ? SQLCS_IMPLICIT : SQLCS_NCHAR);
-    EXPECT_EQ(Attribute<ub2>(again, OCI_DTYPE_PARAM, OCI_ATTR_CHAR_SIZE), 7);
-    EXPECT_EQ(Attribute<ub2>(again, OCI_DTYPE_PARAM, OCI_ATTR_POSITION), 3);
     EXPECT_EQ(OCIDescriptorFree(root, OCI_DTYPE_PARAM), OCI_SUCCESS);
     EXPECT_EQ(Name(again, OCI_ATTR_NAME), "C") << "its object's parameter is gone, its handle lives";
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
-    EXPECT_EQ(Member(describe, nullptr, 1, OCI_HTYPE_DESCRIBE), 21560);
-    columns = Attribute<dvoid*>(root, OCI_DTYPE_PARAM, OCI_ATTR_LIST_COLUMNS);
-    for (const ub4 position : {0u, 4u, kHuge}) EXPECT_EQ(Member(columns, &again, position), 24334) << position;
-    EXPECT_EQ(Member(columns, nullptr, 1), 21560);
-    EXPECT_EQ(Member(root, &again, 1), 24334) << "no list";
+    auto* const columns = Attribute<dvoid*>(root, OCI_DTYPE_PARAM, OCI_ATTR_LIST_COLUMNS);
     ASSERT_EQ(OCIDescriptorAlloc(env_, &again, OCI_DTYPE_PARAM, 0, nullptr), OCI_SUCCESS);
     EXPECT_EQ(Member(again, &again, 1), 24334) << "of nothing";
-    EXPECT_EQ(Member(root, &again, 1, OCI_HTYPE_STMT), OCI_INVALID_HANDLE);
-    EXPECT_EQ(Member(describe, &again, 1, OCI_HTYPE_SERVER), 24316);
-    MUST(Run("drop view v", 1), Run("drop table t", 1));
+    MUST(Run(svc_, "drop view v"), Run(svc_, "drop table t"));
     EXPECT_EQ(Name(root, OCI_ATTR_OBJ_NAME), "T") << "as it was";
-    EXPECT_EQ(Describe(describe, Schema(), OCI_PTYPE_SCHEMA), 0);
+    EXPECT_EQ(Describe(describe, OnServer() ? "public" : "main", OCI_PTYPE_SCHEMA), 0);
     EXPECT_EQ(OCIDescriptorFree(columns, OCI_DTYPE_PARAM), OCI_INVALID_HANDLE) << "gone with what it described";
-    const std::string database = OnServer() ? ann_.substr(4) : "memory";    // of the owner's name
-    dvoid* const described = Described(database.c_str(), OCI_PTYPE_DATABASE);
-    EXPECT_EQ(Attribute<ub1>(described, OCI_DTYPE_PARAM, OCI_ATTR_NOWAIT_SUPPORT),
+    dvoid* const database = Described(OnServer() ? ann_.substr(4).c_str() : "memory", OCI_PTYPE_DATABASE);
+    EXPECT_EQ(Attribute<ub1>(database, OCI_DTYPE_PARAM, OCI_ATTR_NOWAIT_SUPPORT),
               OnServer() ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED);
-    EXPECT_EQ(Attribute<ub2>(described, OCI_DTYPE_PARAM, OCI_ATTR_CHARSET_ID), 873);
-}
-
-TEST_F(AttributesTest, CurrentSchema) {
-    auto* session = Attribute<OCISession*>(svc_, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
-    const auto set = [&](OCISession* on, const char* schema) {
-        return Set(on, OCI_HTYPE_SESSION, OCI_ATTR_CURRENT_SCHEMA, const_cast<char*>(schema), Length(schema));
-    };
-    const auto read = [&](OCISession* of) { return Name(of, OCI_ATTR_CURRENT_SCHEMA, OCI_HTYPE_SESSION); };
-    EXPECT_EQ(read(session), OnServer() ? "KELP" : "MAIN") << "the one of the user's name";
-    EXPECT_EQ(set(session, "other"), 1435);
-    EXPECT_EQ(set(session, Schema()), 0);
-    EXPECT_EQ(read(session), Schema());
-    auto* own = New<OCISession>(OCI_HTYPE_SESSION);
-    EXPECT_EQ(read(own), "");
-    EXPECT_EQ(set(own, "other"), 0) << "asked for when it begins";
-    auto* svc = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
-    EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(Database()), Length(Database()), OCI_DEFAULT)), 0);
-    EXPECT_EQ(Set(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER, server), 0);
-    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, own, OCI_CRED_EXT, OCI_DEFAULT)), 1435);
-    EXPECT_EQ(Answer(OCISessionEnd(svc, err_, own, OCI_DEFAULT)), 1012) << "it did not begin";
-    EXPECT_EQ(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_USERNAME, ann_.data(), Length(ann_.c_str())), 0);
-    SHOULD(Set(own, OCI_HTYPE_SESSION, OCI_ATTR_PASSWORD, const_cast<char*>("secret"), 6), set(own, ann_.c_str()));
-    EXPECT_EQ(Answer(OCISessionBegin(svc, err_, own, OCI_CRED_RDBMS, OCI_DEFAULT)), 0) << "the user's own";
 }
 
 // Converted texts stay where they are while others of the handle are asked for.

@@ -6,7 +6,6 @@
 #include <utility>
 #include <vector>
 
-#include "support/at_once.h"
 #include "support/call_fixture.h"
 
 namespace {
@@ -42,39 +41,6 @@ TEST_F(CallsTest, EveryTypeIsMadeAndFreedOnce) {
             EXPECT_EQ(kind.free(made, type), OCI_INVALID_HANDLE) << "freed twice " << type;
         }
     }
-}
-
-TEST_F(CallsTest, ArrayDescriptorsShareOneLife) {
-    dvoid* array[5] = {};
-    dvoid* extra = nullptr;
-    ASSERT_EQ(OCIArrayDescriptorAlloc(env_, array, OCI_DTYPE_TIMESTAMP, 5, 64, &extra), OCI_SUCCESS);
-    ASSERT_NE(extra, nullptr);
-    std::memset(extra, 0xAA, 64);
-    EXPECT_EQ(OCIDescriptorFree(array[2], OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
-    EXPECT_EQ(OCIArrayDescriptorFree(array, OCI_DTYPE_LOB), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIArrayDescriptorFree(array, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
-    EXPECT_EQ(OCIDescriptorFree(array[4], OCI_DTYPE_TIMESTAMP), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIArrayDescriptorFree(array, OCI_DTYPE_TIMESTAMP), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIArrayDescriptorFree(nullptr, OCI_DTYPE_LOB), OCI_INVALID_HANDLE);
-    EXPECT_EQ(OCIArrayDescriptorAlloc(env_, array, OCI_DTYPE_LOB, 0, 0, nullptr), OCI_ERROR);
-    dvoid* single = nullptr;
-    ASSERT_EQ(OCIDescriptorAlloc(env_, &single, OCI_DTYPE_LOB, 0, nullptr), OCI_SUCCESS);
-    EXPECT_EQ(OCIArrayDescriptorFree(&single, OCI_DTYPE_LOB), OCI_INVALID_HANDLE) << "not made as an array";
-}
-
-TEST_F(CallsTest, UserMemoryComesZeroedAndIsFoundAgain) {
-    dvoid* handle = nullptr;
-    dvoid* extra = nullptr;
-    ASSERT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 100, &extra), OCI_SUCCESS);
-    for (int index = 0; index < 100; ++index) ASSERT_EQ(static_cast<char*>(extra)[index], 0);
-    std::memset(extra, 1, 100);
-    EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_USER_MEMORY), extra);
-    ub4 size = 0;
-    dvoid* of = nullptr;
-    EXPECT_EQ(Answer(OCIAttrGet(handle, OCI_HTYPE_STMT, &of, &size, OCI_ATTR_ENV, err_)), 0);
-    EXPECT_TRUE(of == env_ && size == sizeof of) << size;
-    EXPECT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, SIZE_MAX, &extra), OCI_ERROR) << "more than there is";
-    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 1019);
 }
 
 // Whatever is no living handle of the kind: null, text, a handle of another kind, one that is freed.
@@ -123,59 +89,6 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
             EXPECT_EQ(refused[call], OCI_INVALID_HANDLE) << call;
         EXPECT_EQ(FirstCode(err_), 0) << "no record";
     }
-    EXPECT_EQ(OCIEnvCreate(nullptr, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr), OCI_ERROR);
-    EXPECT_EQ(OCIHandleAlloc(env_, nullptr, OCI_HTYPE_STMT, 0, nullptr), OCI_ERROR);
-    EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 21560);
-    for (const bool given : {true, false}) {
-        EXPECT_EQ(OCIArrayDescriptorAlloc(env_, given ? &out : nullptr, OCI_DTYPE_LOB, given ? 0 : 1, 0, nullptr), OCI_ERROR);
-        EXPECT_EQ(FirstCode(env_, OCI_HTYPE_ENV), 21560);
-    }
-    EXPECT_EQ(OCILogon(env_, err_, nullptr, nullptr, 0, nullptr, 0, nullptr, 0), OCI_ERROR);
-    EXPECT_EQ(OCIServerVersion(server, err_, nullptr, 0, OCI_HTYPE_SERVER), OCI_ERROR);
-}
-
-// A message beyond what callers have room for is cut to that, and still ends its line.
-TEST_F(CallsTest, LongMessagesEndTheirLine) {
-    for (const ub4 mode : {ub4{OCI_DEFAULT}, ub4{OCI_UTF16}}) {
-        OCIEnv* env = NewEnvironment(mode);
-        OCIError* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
-        const std::size_t unit = mode == OCI_UTF16 ? 2 : 1;
-        ASSERT_EQ(OCIFileInit(env, err), OCI_SUCCESS);
-        for (const std::size_t length : {100, 400, 500, 900, 1000, 2000}) {
-            std::string name;
-            for (std::size_t index = 0; index <= length; ++index) {
-                name += index < length ? 'n' : '\0';
-                if (unit == 2) name += '\0';
-            }
-            OCIFileObject* file = nullptr;
-            EXPECT_EQ(OCIFileOpen(env, err, &file, reinterpret_cast<OraText*>(name.data()), nullptr,
-                                  OCI_FILE_READ_ONLY, OCI_FILE_EXIST, OCI_FILE_BIN), OCI_ERROR);
-            std::string text(OCI_ERROR_MAXMSG_SIZE, 'x');
-            EXPECT_EQ(OCIErrorGet(err, 1, nullptr, nullptr, reinterpret_cast<OraText*>(text.data()),
-                                  OCI_ERROR_MAXMSG_SIZE, OCI_HTYPE_ERROR), OCI_SUCCESS) << mode << ' ' << length;
-            std::string line;
-            for (std::size_t at = 0; at < text.size() && text[at] != '\0'; at += unit) line += text[at];
-            EXPECT_EQ(line.find('\n'), line.size() - 1) << mode << ' ' << length << ": " << line;
-            const std::size_t longest = OCI_ERROR_MAXMSG_SIZE / unit - 1;
-            EXPECT_EQ(line.size() == longest, length + 40 >= longest) << mode << ' ' << length << ": " << line.size();
-        }
-        MUST(OCIFileTerm(env, err), OCIHandleFree(env, OCI_HTYPE_ENV));
-    }
-}
-
-// Databases by their words; the rest of logons stands in transcripts.
-TEST_F(CallsTest, LogonsFindTheirDatabase) {
-    OCISvcCtx* svc = nullptr;
-    std::ofstream(Folder() + "/kelpcli.ini") << "[Remote]\nurl = postgresql:///db?host=/no/such\n";
-    for (const char* database : {"postgres:///db?host=/no/such", "remote"}) {
-        EXPECT_EQ(LogOn(&svc, database, "ann", "secret"), 12541);
-        EXPECT_EQ(svc, nullptr) << "nothing is made by a logon that fails";
-    }
-    EXPECT_EQ(LogOn(&svc, nullptr, "ann", "secret"), 0) << "the default database";
-    EXPECT_TRUE(std::filesystem::exists(Folder() + "/kelp.db"));
-    EXPECT_EQ(Answer(OCILogon(env_, err_, &svc, Text("ann"), 4294967295u, Text("secret"), 100, Text("test"), 9000)), 0)
-        << "lengths beyond the ends of the texts";
-    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
 }
 
 // A password that is too long is found out when the session has begun, which does not stay.
@@ -220,6 +133,7 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     dvoid *handle = nullptr, *extra = nullptr;
     ASSERT_EQ(OCIHandleAlloc(env, &handle, OCI_HTYPE_STMT, 9, &extra), OCI_SUCCESS);
     EXPECT_EQ(std::string(static_cast<char*>(extra), 9), std::string(9, '\0'));
+    EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_USER_MEMORY), extra);
     EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 1);
     EXPECT_EQ(Attribute<ub4>(env, OCI_HTYPE_ENV, OCI_ATTR_OBJECT), 1u);
     EXPECT_EQ(Attribute<ub2>(env, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
@@ -274,27 +188,6 @@ TEST_F(CallsTest, AHandleWhereAnotherOneWas) {
         EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), nullptr) << type;
     }
     ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
-}
-
-// Handles come and go in many threads while others are looked up: growth of the set of living objects included.
-TEST_F(CallsTest, HandlesFromManyThreads) {
-    Reopen(OCI_THREADED);
-    AtOnce(8, [&](int number) {
-        auto* err = New<OCIError>(OCI_HTYPE_ERROR);
-        OCISvcCtx* svc = nullptr;
-        const std::string file = Folder() + "/t" + std::to_string(number) + ".db";
-        EXPECT_EQ(OCILogon(env_, err, &svc, nullptr, 0, nullptr, 0, Text(file), static_cast<ub4>(file.size())), 0);
-        std::vector<dvoid*> handles(600);
-        int wrong = 0;
-        for (int round = 0; round < 3; ++round) {
-            for (dvoid*& handle : handles)
-                wrong += OCIHandleAlloc(env_, &handle, OCI_HTYPE_TRANS, 0, nullptr) != OCI_SUCCESS;
-            for (dvoid*& handle : handles) wrong += OCIHandleFree(handle, OCI_HTYPE_TRANS) != OCI_SUCCESS;
-            for (dvoid*& handle : handles) wrong += OCIHandleAlloc(env_, &handle, 99, 0, nullptr) != OCI_ERROR;
-            wrong += OCIPing(svc, err, 0) != OCI_SUCCESS;
-        }
-        EXPECT_EQ(wrong + OCILogoff(svc, err), 0);
-    });
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
-// Pools: what a full pool answers, what ends do, and many threads at once. Refusals and tags stand in
-// transcripts/walk_pools.
+// Pools: what rests and what ends, and many threads at once. Sizes, refusals and tags stand in transcripts/pool_states
+// and walk_pools.
 #include <atomic>
 #include <chrono>
 #include <mutex>
@@ -12,7 +12,6 @@ namespace {
 
 using namespace std::chrono_literals;
 
-constexpr ub4 kSpool = OCI_SESSGET_SPOOL;
 constexpr ub4 kHomogeneous = OCI_SPC_HOMOGENEOUS;
 
 class Pools : public CallFixture {
@@ -24,26 +23,19 @@ protected:
         pool_ = New<OCISPool>(OCI_HTYPE_SPOOL);
     }
 
-    sb4 Create(ub4 least, ub4 most, ub4 step, ub4 mode = kHomogeneous, const char* user = nullptr,
-               const char* password = "secret") {
+    sb4 Create(ub4 least, ub4 most, ub4 step, ub4 mode = kHomogeneous) {
         OraText* name = nullptr;
         ub4 length = 0;
-        if (!user) user = ann_.c_str();
         const sword code = OCISessionPoolCreate(env_, err_, pool_, &name, &length, Text("work"), 4, least, most, step,
-                                                Text(user), Length(user), Text(password), Length(password), mode);
+                                                Text(ann_), Length(ann_.c_str()), Text("secret"), 6, mode);
         if (code == OCI_SUCCESS) name_.assign(reinterpret_cast<char*>(name), length);
         return Answer(code);
     }
-    sb4 Get(OCISvcCtx** svc, OCIError* err, ub4 mode = kSpool, OCIAuthInfo* auth = nullptr) {
-        const sword code = OCISessionGet(env_, err, svc, auth, Text(name_), static_cast<ub4>(name_.size()), nullptr, 0,
-                                         nullptr, nullptr, nullptr, mode);
-        return code == OCI_SUCCESS_WITH_INFO ? FirstCode(err) : Answer(code, err);
-    }
-    // For threads.
-    sb4 GetPlain(OCISvcCtx** svc, OCIError* err, std::string_view name) const {
+    sb4 Get(OCISvcCtx** svc, OCIError* err, std::string_view name) const {
         return Answer(OCISessionGet(env_, err, svc, nullptr, Text(name), static_cast<ub4>(name.size()), nullptr, 0,
-                                    nullptr, nullptr, nullptr, kSpool), err);
+                                    nullptr, nullptr, nullptr, OCI_SESSGET_SPOOL), err);
     }
+    sb4 Get(OCISvcCtx** svc, OCIError* err) const { return Get(svc, err, name_); }
     sb4 Release(OCISvcCtx* svc, ub4 mode = OCI_DEFAULT) {
         return Answer(OCISessionRelease(svc, err_, nullptr, 0, mode));
     }
@@ -54,50 +46,19 @@ protected:
     sb4 Set(ub4 attribute, T value) {
         return Answer(OCIAttrSet(pool_, OCI_HTYPE_SPOOL, &value, 0, attribute, err_));
     }
-    sb4 Run(OCISvcCtx* svc, const char* sql) const {
-        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-        sb4 answer = Answer(OCIStmtPrepare(stmt, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT));
-        if (answer == 0) answer = Answer(OCIStmtExecute(svc, stmt, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
-        OCIHandleFree(stmt, OCI_HTYPE_STMT);
-        return answer;
-    }
-    OCIAuthInfo* User(const char* user, const char* password) {
-        auto* auth = New<OCIAuthInfo>(OCI_HTYPE_AUTHINFO);
-        for (const auto& [text, attribute] : {std::pair(user, OCI_ATTR_USERNAME), std::pair(password, OCI_ATTR_PASSWORD)})
-            EXPECT_EQ(Answer(OCIAttrSet(auth, OCI_HTYPE_AUTHINFO, Text(text), Length(text), attribute, err_)), 0);
-        return auth;
-    }
     OCISPool* pool_ = nullptr;
     std::string name_;
 };
 
-TEST_F(Pools, WhatAFullPoolAnswers) {
+// The idle go when somebody looks, down to the least.
+TEST_F(Pools, TheIdleGo) {
     ASSERT_EQ(Create(0, 1, 1), 0);
     OCISvcCtx *svc = nullptr, *second = nullptr;
-    ASSERT_EQ(Get(&svc, err_), 0);
-    EXPECT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, 4), 24328);
-    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_NOWAIT), 0);
-    EXPECT_EQ(Get(&second, err_), 24418);
-    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT), 0);
-    ASSERT_EQ(Set<ub4>(OCI_ATTR_SPOOL_WAIT_TIMEOUT, 20), 0);
-    EXPECT_EQ(Attribute<ub4>(pool_, OCI_HTYPE_SPOOL, OCI_ATTR_SPOOL_WAIT_TIMEOUT), 20u);
-    const auto begun = std::chrono::steady_clock::now();
-    EXPECT_EQ(Get(&second, err_), 24496);
-    const auto waited = std::chrono::steady_clock::now() - begun;
-    EXPECT_TRUE(waited >= 20ms && waited < 15s) << "milliseconds";
-    ASSERT_EQ(Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_FORCEGET), 0);
-    EXPECT_EQ(Get(&second, err_), 24417);
-    EXPECT_EQ(OpenCount(), 2u);
-    EXPECT_EQ(Release(second), 0);
-    EXPECT_EQ(OpenCount(), 1u);
-    // The idle go when somebody looks, down to the least.
-    MUST(Release(svc), Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1));
+    MUST(Get(&svc, err_), Release(svc), Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 1));
     EXPECT_EQ(OpenCount(), 1u);
     std::this_thread::sleep_for(1100ms);
     EXPECT_EQ(OpenCount(), 0u);
-    ASSERT_EQ(Create(2, 2, 0, OCI_SPC_REINITIALIZE), 0);
-    for (OCISvcCtx** place : {&svc, &second}) ASSERT_EQ(Get(place, err_), 0);
-    ASSERT_EQ(Release(svc), 0);
+    MUST(Create(2, 2, 0, OCI_SPC_REINITIALIZE), Get(&svc, err_), Get(&second, err_), Release(svc));
     std::this_thread::sleep_for(1100ms);
     EXPECT_EQ(OpenCount(), 2u) << "no fewer than the least";
     MUST(Set<ub4>(OCI_ATTR_SPOOL_TIMEOUT, 0), Create(1, 2, 1, OCI_SPC_REINITIALIZE));
@@ -105,7 +66,7 @@ TEST_F(Pools, WhatAFullPoolAnswers) {
     EXPECT_EQ(OpenCount(), 1u) << "that which rested long, though the other has just come";
 }
 
-// Release and logoff commit; what is taken away rolls back; nothing of a former session reaches the next.
+// What is taken away rolls back; nothing of a former session reaches the next but its statements.
 TEST_F(Pools, WhatASessionLeaves) {
     ASSERT_EQ(Create(0, 1, 1, kHomogeneous | OCI_SPC_STMTCACHE), 0);
     OCISvcCtx* svc = nullptr;
@@ -113,22 +74,16 @@ TEST_F(Pools, WhatASessionLeaves) {
     const auto prepare = [&](OCIStmt** place) {
         return Answer(OCIStmtPrepare2(svc, place, err_, Text("select n from t"), 15, nullptr, 0, OCI_NTV_SYNTAX, 0));
     };
-    ASSERT_EQ(Get(&svc, err_), 0);
-    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
-    MUST(Run(svc, "create table t(n number)"), Run(svc, "insert into t values(1)"), prepare(&stmt));
-    ASSERT_EQ(Answer(OCIStmtExecute(svc, stmt, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
-    MUST(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), prepare(&again));
-    EXPECT_EQ(again, stmt);
-    MUST(Answer(OCIStmtRelease(again, err_, nullptr, 0, OCI_DEFAULT)), Answer(OCIBreak(svc, err_)), Release(svc));
+    MUST(Get(&svc, err_), Run(svc, "create table t(n number unique)"), prepare(&stmt));
+    MUST(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), Answer(OCIBreak(svc, err_)), Release(svc));
 
     MUST(Get(&svc, err_), prepare(&again));
     EXPECT_EQ(again, stmt) << "the cache stays with the connection";
     EXPECT_EQ(Answer(OCIStmtExecute(svc, again, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0) << "1013 is not its";
-    ASSERT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 24374);
     MUST(Run(svc, "insert into t values(2)"), Release(svc));
     EXPECT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 3114) << "its session is over";
 
-    MUST(Get(&svc, err_), Run(svc, "create unique index i on t(n)"));
+    ASSERT_EQ(Get(&svc, err_), 0);
     auto* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
     auto* err = New<OCIError>(OCI_HTYPE_ERROR);
     AtOnce(2, [&](int index) {    // a break reaches the connection that came from the pool
@@ -146,24 +101,10 @@ TEST_F(Pools, WhatASessionLeaves) {
     EXPECT_EQ(Run(svc, "insert into t values(4)"), 1012);
     EXPECT_EQ(Release(svc), 1012);
     EXPECT_EQ(Release(svc), OCI_INVALID_HANDLE) << "the context has gone all the same";
-    ASSERT_EQ(Create(1, 1, 1), 0) << "the handle serves anew";
-    ASSERT_EQ(Get(&svc, err_), 0);
+    MUST(Create(1, 1, 1), Get(&svc, err_));
     EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u) << "of the handle, that was told before";
     EXPECT_EQ(Run(svc, "insert into t values(3)"), 0) << "force has rolled back";
-    ASSERT_EQ(Release(svc, OCI_SESSRLS_DROPSESS), 0);
-    EXPECT_EQ(OpenCount(), 0u);
-    for (const auto& [size, mode, cache] : {std::tuple(0u, kHomogeneous, 0u), {7u, kHomogeneous | OCI_SPC_STMTCACHE, 7u}}) {
-        MUST(Destroy(), Set<ub4>(OCI_ATTR_SPOOL_STMTCACHESIZE, size), Create(0, 1, 1, mode));
-        svc = nullptr;
-        ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text(name_), static_cast<ub4>(name_.size()),
-                                   OCI_LOGON2_SPOOL)), 0);
-        EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), cache) << "only where it is wanted";
-        if (cache == 0) {
-            EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
-        }
-    }
     ASSERT_EQ(prepare(&stmt), 0);    // kept to the environment's end
-    ASSERT_EQ(Answer(OCIStmtExecute(svc, stmt, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
     ASSERT_EQ(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), 0);
 }
 
@@ -180,7 +121,7 @@ TEST_F(Pools, WhoWaitsComesFirst) {
         std::thread waits([&] {
             OCISvcCtx* svc = nullptr;
             begins = true;
-            EXPECT_EQ(GetPlain(&svc, err, name_), 0);
+            EXPECT_EQ(Get(&svc, err), 0);
             came = true;
             EXPECT_EQ(OCISessionRelease(svc, err, nullptr, 0, OCI_DEFAULT), 0);
         });
@@ -209,7 +150,7 @@ TEST_F(Pools, ManyThreadsShareAFewSessions) {
         auto* err = New<OCIError>(OCI_HTYPE_ERROR);
         for (int round = 0; round < 60; ++round) {
             OCISvcCtx* svc = nullptr;
-            failures += GetPlain(&svc, err, name_) != 0;
+            failures += Get(&svc, err) != 0;
             failures += ++in_use > 3;
             failures += OCIPing(svc, err, OCI_DEFAULT) != OCI_SUCCESS;
             --in_use;
@@ -234,7 +175,7 @@ TEST_F(Pools, WhoWaitsIsToldWhenThePoolGoes) {
             OCISvcCtx* own = nullptr;
             if (index > 0) {
                 ++waiting;
-                const sb4 answer = GetPlain(&own, err, name_);
+                const sb4 answer = Get(&own, err);
                 EXPECT_TRUE(freed || answer == 24416) << answer;
                 EXPECT_EQ(own, nullptr);
                 return;
@@ -272,7 +213,7 @@ TEST_F(Pools, DestroyedAndMadeAnewUnderLoad) {
                 name = name_;
             }
             OCISvcCtx* svc = nullptr;
-            const sb4 got = GetPlain(&svc, err, name);
+            const sb4 got = Get(&svc, err, name);
             odd += got != 0 && got != 24416 && got != 3114;
             if (got != 0) continue;
             (void)OCIPing(svc, err, OCI_DEFAULT);

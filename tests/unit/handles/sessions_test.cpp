@@ -37,18 +37,6 @@ protected:
     sb4 LogOn(OCISvcCtx** svc, const char* database, OCIError* err) const {
         return Answer(OCILogon(env_, err, svc, nullptr, 0, nullptr, 0, Text(database), Length(database)), err);
     }
-    sb4 Run(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, const char* sql, ub4 iterations) const {
-        const sb4 prepared =
-            Answer(OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), err);
-        if (prepared != 0) return prepared;
-        return Answer(OCIStmtExecute(svc, stmt, err, iterations, 0, nullptr, nullptr, OCI_DEFAULT), err);
-    }
-    sb4 Run(OCISvcCtx* svc, const char* sql) const {
-        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
-        const sb4 answer = Run(svc, stmt, err_, sql, 1);
-        OCIHandleFree(stmt, OCI_HTYPE_STMT);
-        return answer;
-    }
     OCIServer* NewServer(const char* database) const {
         auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
         EXPECT_EQ(Answer(OCIServerAttach(server, err_, Text(database), static_cast<sb4>(Length(database)), 0)), 0);
@@ -84,19 +72,11 @@ TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
     }
 }
 
-TEST_F(Sessions, AttributesFollowWhatHappens) {
+TEST_F(Sessions, AServerIsBusyWhileACallRuns) {
     OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(Answer(OCILogon2(env_, err_, &svc, nullptr, 0, nullptr, 0, Text("here"), 4, OCI_LOGON2_STMTCACHE)), 0);
-    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u);
-    auto* session = Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION);
-    const auto open = [&] { return Attribute<ub4>(session, OCI_HTYPE_SESSION, OCI_ATTR_NUM_OPEN_STMTS); };
-    EXPECT_EQ(open(), 0u);
-    ASSERT_EQ(Run(svc, New<OCIStmt>(OCI_HTYPE_STMT), err_, "select 1 from dual", 0), 0);
-    EXPECT_EQ(open(), 1u);
-    ASSERT_EQ(Run(svc, "create table t(n number)"), 0);
+    MUST(LogOn(&svc, "here"), Run(svc, "create table t(n number)"));
     auto* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
     const auto busy = [&] { return Attribute<ub1>(server, OCI_HTYPE_SERVER, OCI_ATTR_SERVER_BUSY); };
-    EXPECT_EQ(busy(), 0);
     AtOnce(2, [&](int index, OCIError* err) {
         if (index == 0) {
             EXPECT_EQ(Run(svc, New<OCIStmt>(OCI_HTYPE_STMT), err, "insert into t with recursive r(n) as (select 1 union all"
@@ -107,50 +87,35 @@ TEST_F(Sessions, AttributesFollowWhatHappens) {
         EXPECT_EQ(Answer(OCIBreak(svc, err), err), 0);
     });
     EXPECT_EQ(busy(), 0);
-    ASSERT_EQ(Answer(OCILogoff(svc, err_)), 0);
-    EXPECT_EQ(open(), 0u);
-    EXPECT_EQ(Attribute<OCISession*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SESSION), nullptr);
-    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 0u) << "goes with the logon";
 }
 
 // ---- Several threads
 
-TEST_F(Sessions, TwoThreadsEndEachOthersSessions) {
+// Two threads end each other's sessions; then one of the two begins a session that both want.
+TEST_F(Sessions, BegunAndEndedByTwoThreads) {
     OCIServer* server = NewServer(":memory:");
-    OCISession* sessions[2];
-    OCISvcCtx* contexts[2];
-    for (int index = 0; index < 2; ++index) {
-        sessions[index] = New<OCISession>(OCI_HTYPE_SESSION);
-        contexts[index] = NewContext(server, sessions[index]);
-    }
-    Turn turn;
-    AtOnce(2, [&](int index, OCIError* err) {
-        for (int round = 0; round < 400; ++round) {
-            EXPECT_EQ(Answer(OCISessionBegin(contexts[index], err, sessions[index], OCI_CRED_EXT, 0), err), 0);
-            turn.Wait();
-            EXPECT_EQ(Answer(OCISessionEnd(contexts[index], err, sessions[1 - index], 0), err), 0);
-            turn.Wait();
-        }
-    });
-}
-
-TEST_F(Sessions, OneOfTwoThreadsBeginsASession) {
-    OCIServer* server = NewServer(":memory:");
-    auto* session = New<OCISession>(OCI_HTYPE_SESSION);
-    OCISvcCtx* contexts[] = {NewContext(server, session), NewContext(server, session)};
+    OCISession* sessions[] = {New<OCISession>(OCI_HTYPE_SESSION), New<OCISession>(OCI_HTYPE_SESSION)};
+    OCISvcCtx* contexts[] = {NewContext(server, sessions[0]), NewContext(server, sessions[1])};
+    OCISvcCtx* same[] = {contexts[0], NewContext(server, sessions[0])};
     Turn turn;
     sb4 answers[2];
     AtOnce(2, [&](int index, OCIError* err) {
+        const auto begin = [&](OCISvcCtx* svc, OCISession* session) {
+            return Answer(OCISessionBegin(svc, err, session, OCI_CRED_EXT, 0), err);
+        };
         for (int round = 0; round < 400; ++round) {
+            EXPECT_EQ(begin(contexts[index], sessions[index]), 0);
             turn.Wait();
-            answers[index] = Answer(OCISessionBegin(contexts[index], err, session, OCI_CRED_EXT, 0), err);
+            EXPECT_EQ(Answer(OCISessionEnd(contexts[index], err, sessions[1 - index], 0), err), 0);
+            turn.Wait();
+            answers[index] = begin(same[index], sessions[0]);
             turn.Wait();
             if (index == 0) {
-                EXPECT_EQ(std::min(answers[0], answers[1]), 0) << "round " << round;
-                EXPECT_EQ(std::max(answers[0], answers[1]), 24313) << "round " << round;
-                EXPECT_EQ(Answer(OCIPing(contexts[1], err, 0), err), 0);
-                EXPECT_EQ(Answer(OCISessionEnd(contexts[0], err, session, 0), err), 0);
+                EXPECT_TRUE(std::minmax({answers[0], answers[1]}) == std::pair(0, 24313)) << "round " << round;
+                EXPECT_EQ(Answer(OCIPing(same[1], err, 0), err), 0);
+                EXPECT_EQ(Answer(OCISessionEnd(same[0], err, sessions[0], 0), err), 0);
             }
+            turn.Wait();
         }
     });
 }

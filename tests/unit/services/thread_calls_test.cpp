@@ -59,12 +59,6 @@ struct Work {
     std::atomic<int> failures{0};
 };
 
-TEST_F(ThreadCalls, NoPlaceToEmpty) {
-    const sb4 answers[] = {Answer(OCIThreadMutexDestroy(env_, err_, nullptr)), Answer(OCIThreadKeyDestroy(env_, err_, nullptr)),
-                           Answer(OCIThreadIdDestroy(env_, err_, nullptr)), Answer(OCIThreadHndDestroy(env_, err_, nullptr))};
-    for (const sb4& answer : answers) EXPECT_EQ(answer, 21560) << &answer - answers;
-}
-
 TEST_F(ThreadCalls, AThreadThatNobodyKnows) {
     EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, nullptr)), 0);
     while (destroyed == 0) std::this_thread::yield();

@@ -108,6 +108,18 @@ protected:
         return Answer(OCILogon(env_, err_, svc, Text(user), Length(user), Text(password), Length(password),
                                Text(database), Length(database)));
     }
+    sb4 Run(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, const char* sql, ub4 iterations) const {
+        const sb4 prepared = Answer(OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), err);
+        if (prepared != 0) return prepared;
+        return Answer(OCIStmtExecute(svc, stmt, err, iterations, 0, nullptr, nullptr, OCI_DEFAULT), err);
+    }
+    // In a statement of its own.
+    sb4 Run(OCISvcCtx* svc, const char* sql) const {
+        auto* stmt = New<OCIStmt>(OCI_HTYPE_STMT);
+        const sb4 answer = Run(svc, stmt, err_, sql, 1);
+        OCIHandleFree(stmt, OCI_HTYPE_STMT);
+        return answer;
+    }
     template <class T>
     T Attribute(const dvoid* handle, ub4 type, ub4 attribute) const {
         T value{};
