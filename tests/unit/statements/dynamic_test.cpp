@@ -92,8 +92,6 @@ struct Taker : Callback {
 
 class Dynamic : public StatementTest {
 protected:
-    explicit Dynamic(ub4 mode = OCI_DEFAULT) : StatementTest(mode) {}
-
     sb4 BindTo(ub4 position, Callback* in, Callback* out, ub2 type = SQLT_CHR) {
         OCIBind*& bind = binds_[position];
         bind = nullptr;
@@ -133,27 +131,6 @@ TEST_F(Dynamic, ValuesGoInByIteration) {
         EXPECT_EQ(giver.asked, c.asked);
         EXPECT_EQ(One("select group_concat(nvl(a, '-'), ',') from t"), c.stored);
         MustRun("drop table t");
-    }
-}
-
-TEST_F(Dynamic, RowsComeOutByCallbacks) {
-    MustRun("create table t(id number, a varchar2(40), b raw(20), c clob)",
-            "insert into t values(1, 'abcdefg', x'0102', 'text one'), (2, null, null, null), (3, 'x', x'FF', null)");
-    for (const ub4 rows : {1, 2, 3}) {
-        Taker a(3), b(20), c(4);
-        sb4 ids[3] = {};
-        MUST(Prepare("select a, b, c, id from t order by id"), DefineTo(1, a), DefineTo(2, b, SQLT_LBI));
-        MUST(DefineTo(3, c, SQLT_LNG), Define(4, Int(ids)), Execute(0));
-        sword rc = OCI_SUCCESS;
-        for (ub4 done = 0; rc == OCI_SUCCESS && done < 3; done += RowsFetched()) rc = FetchCode(rows);
-        EXPECT_EQ(a.Flush(), "abcdefg|-|x|");
-        EXPECT_EQ(b.Flush(), string("\1\2|-|\xff|"));
-        EXPECT_EQ(c.Flush(), "text one|-|-|");
-        EXPECT_EQ(ids[(3 - 1) % rows], 3);
-        EXPECT_EQ(a.asked, rows == 1 ? "0.0.0 0.0.2 0.0.2 0.0.0 0.0.0 "
-                           : rows == 2 ? "0.0.0 0.0.2 0.0.2 1.0.0 0.0.0 " : "0.0.0 0.0.2 0.0.2 1.0.0 2.0.0 ");
-        EXPECT_EQ(a.code, 0);
-        EXPECT_EQ(c.code, 1405);
     }
 }
 
@@ -202,30 +179,6 @@ TEST_F(Dynamic, BlocksAndTables) {
     ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR), OCI_DEFAULT, 4, &(count = 0)), 0);
     MUST(Answer(OCIBindDynamic(binds_[1], err, &elements, Callback::In, &selected, Callback::Out)), Execute());
     EXPECT_EQ(selected.Flush(), "p|q|r|s|");
-}
-
-// A name that stands twice is asked for once; iterations count from the row offset.
-TEST_F(Dynamic, RepeatedNamesAndRowOffset) {
-    MustRun("create table t(a varchar2(40), b varchar2(40), c varchar2(40))");
-    Giver giver({"=x", "=y"});
-    char plain[3][2] = {"0", "1", "2"};
-    ASSERT_EQ(Prepare("insert into t values(:v, :w, :v)"), 0);
-    const auto& v = InPieces(SQLT_CHR);
-    ASSERT_EQ(Answer(OCIBindByName(stmt, &binds_[1], err, Bytes(":v"), 2, nullptr, v.size, v.type, nullptr, nullptr,
-                                   nullptr, 0, nullptr, OCI_DATA_AT_EXEC)), 0);
-    ASSERT_EQ(BindName(":w", Text(plain)), 0);
-    ub4 iteration = 9;
-    EXPECT_EQ(ExecuteCode(3, OCI_DEFAULT, 1), OCI_NEED_DATA);
-    ASSERT_EQ(Answer(OCIStmtGetPieceInfo(stmt, err, nullptr, nullptr, nullptr, &iteration, nullptr, nullptr)), 0);
-    EXPECT_EQ(iteration, 1u);
-    ASSERT_EQ(Answer(OCIBindDynamic(binds_[1], err, &giver, Callback::In, nullptr, nullptr)), 0);
-    char first[] = "w";
-    ub4 length = 1;
-    EXPECT_EQ(Answer(OCIStmtSetPieceInfo(binds_[1], OCI_HTYPE_BIND, err, first, &length, 0, nullptr, nullptr)), 24370)
-        << "a callback gives it now";
-    EXPECT_EQ(Execute(3, OCI_DEFAULT, 1), 0);
-    EXPECT_EQ(giver.asked, "1.0.0 2.0.0 ");
-    EXPECT_EQ(One("select group_concat(a || b || c, ',') from t"), "x1x,y2y");
 }
 
 // What a callback must not answer, in either direction; a place is not looked at where the value is null.
@@ -367,26 +320,6 @@ TEST_F(Dynamic, CutValuesAndFailedRows) {
     MUST(BindTo(2, nullptr, &returned), Bind(3, Text(narrow)));
     EXPECT_EQ(Execute(2, OCI_BATCH_ERRORS), 24381);
     EXPECT_EQ(returned.asked, "1.0.0 ");
-}
-
-class Utf16Dynamic : public Dynamic {
-protected:
-    Utf16Dynamic() : Dynamic(OCI_UTF16) {}
-};
-
-// Pieces may tear a character going in, and do not coming out.
-TEST_F(Utf16Dynamic, PiecesOfUnits) {
-    MustRun("create table t(a varchar2(40))");
-    const string text(reinterpret_cast<const char*>(u"a\U0001F600z"), 8);
-    Giver giver({"<" + text.substr(0, 3), "+" + text.substr(3, 2), ">" + text.substr(5)});
-    Taker returned(5), bytes(5), fetched(20);
-    MUST(Prepare("insert into t values(:1) returning a, x'c3a4' into :2, :3"), BindTo(1, &giver, nullptr));
-    MUST(BindTo(2, nullptr, &returned), BindTo(3, nullptr, &bytes, SQLT_BIN), Execute());
-    EXPECT_EQ(bytes.Flush(), "\xC3\xA4|");
-    EXPECT_EQ(returned.Flush(), text + "|");
-    EXPECT_EQ(returned.asked, "0.0.0 0.0.2 0.0.2 ");
-    MUST(Prepare("select a || a from t"), DefineTo(1, fetched, SQLT_STR), Execute(1));
-    EXPECT_EQ(fetched.Flush(), text + text + "|");
 }
 
 }  // namespace

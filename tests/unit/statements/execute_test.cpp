@@ -1,125 +1,86 @@
-// Executing: modes, counts, array changes and their failures, transactions, blocks.
+// Executing and fetching: rows that fail, index-table arguments at their limits, what comes back into binds, lengths.
 #include "support/statement_fixture.h"
 
 namespace {
 
-class Executing : public StatementTest {
-protected:
-    std::string Rows() { return One("select count(*) from t"); }
-    // The rows that failed in the last execute with batch errors: "number in row, " for each.
-    std::string BatchErrors() const {
-        std::string all;
-        auto* const other = New<OCIError>(OCI_HTYPE_ERROR);
-        const auto count = Attribute<ub4>(OCI_ATTR_NUM_DML_ERRORS);
-        for (ub4 index = 0; index < count; ++index) {
-            dvoid* row = nullptr;
-            sb4 number = 0;
-            EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, index), OCI_SUCCESS) << index;
-            OCIErrorGet(row, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
-            const auto at = Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, row, OCI_HTYPE_ERROR);
-            all += std::to_string(number) + " in " + std::to_string(at) + ", ";
-        }
-        dvoid* none = nullptr;
-        EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &none, count), OCI_ERROR) << "no more than these";
-        return all;
-    }
-};
+class Executing : public StatementTest {};
 
-TEST_F(Executing, TruncateEmptiesTheTableForGood) {
-    MustRun("create table t(a number)", "insert into t values(1)");
-    ASSERT_EQ(Prepare("truncate table t"), 0);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_STMT_TYPE), 0);
-    EXPECT_EQ(Execute(), 0);
-    MustRun("rollback");
-    EXPECT_EQ(Rows(), "0");
-    EXPECT_EQ(Run("truncate table missing"), 942);
-}
-
-// Rows 1 and 3 break the constraint: the others are done and counted.
+// What holds one of the failures is another than the handle that has them, and forgets what it told before.
 TEST_F(Executing, RowsThatFail) {
     MustRun("create table t(a number primary key)", "insert into t values(2)");
     sb4 numbers[5] = {1, 2, 3, 2, 5};
     ASSERT_EQ(Ready("insert into t values(:1)", {Int(numbers)}), 0);
-    const sword rc = ExecuteCode(5, OCI_BATCH_ERRORS);
-    EXPECT_EQ(rc, OCI_SUCCESS_WITH_INFO);
-    EXPECT_EQ(Answer(rc), 24381);
-    EXPECT_EQ(RowCount(), 3u);
-    dvoid* row = err;    // which is no place for one of its own failures
+    EXPECT_EQ(Execute(5, OCI_BATCH_ERRORS), 24381);
+    dvoid* row = err;
     auto* const other = New<OCIError>(OCI_HTYPE_ERROR);
-    EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, 0), OCI_SUCCESS);
-    EXPECT_NE(row, err);
-    EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, 1), OCI_SUCCESS);
-    EXPECT_EQ(OCIErrorGet(row, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA) << "what it told before is gone";
-    EXPECT_EQ((StatementCalls{env, other}.Answer(OCIParamGet(err, OCI_HTYPE_ERROR, other, nullptr, 0))), 21560);
-    EXPECT_EQ(BatchErrors(), "1 in 1, 1 in 3, ");
-}
-
-TEST_F(Executing, ValueThatCannotBeReadFailsItsRow) {
-    MustRun("create table t(a number)");
-    char areas[3][4] = {{'1', 0, 0, 0}, {'1', '2', '3', '4'}, {'5', 0, 0, 0}};
-    ASSERT_EQ(Ready("insert into t values(:1)", {Text(areas)}), 0);
-    EXPECT_EQ(Execute(3), 1480) << "no terminator in the second area";
-    EXPECT_EQ(Rows(), "1");
-}
-
-// What was compiled and opened on one session is left behind when the statement is executed on another.
-TEST_F(Executing, ThroughAnotherSession) {
-    OCISvcCtx* services[2] = {svc, nullptr};
-    ASSERT_EQ(Logon(&services[1]), OCI_SUCCESS);
-    for (const sb4 number : {1, 2}) {
-        svc = services[number - 1];
-        MustRun("create temporary table t(a number)", "insert into t values(" + std::to_string(number) + ")");
+    for (const ub4 failure : {0u, 1u}) {
+        EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, failure), OCI_SUCCESS);
+        EXPECT_NE(row, err);
+        EXPECT_EQ(Attribute<ub4>(OCI_ATTR_DML_ROW_OFFSET, row, OCI_HTYPE_ERROR), 2 * failure + 1);
     }
-    sb4 value = 0;
-    ASSERT_EQ(Query("select a from t", {Int(value)}, 0), 0);
-    for (const sb4 number : {2, 1, 2}) {
-        svc = services[number - 1];
-        MUST(Execute(0), Fetch());
-        EXPECT_EQ(value, number);
-        for (OCISvcCtx* service : services) {
-            const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, service, OCI_HTYPE_SVCCTX);
-            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), service == svc ? 1u : 0u);
+    EXPECT_EQ(OCIErrorGet(row, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
+    EXPECT_EQ(OCIParamGet(err, OCI_HTYPE_ERROR, other, &row, 2), OCI_ERROR) << "no more than these";
+    EXPECT_EQ((StatementCalls{env, other}.Answer(OCIParamGet(err, OCI_HTYPE_ERROR, other, nullptr, 0))), 21560);
+}
+
+// Rows are told of the last execution that succeeds, whatever fails behind it.
+TEST_F(Executing, RowsReturnedByTheLastExecution) {
+    const struct { std::array<sb4, 3> in; ub4 mode; sb4 answer; ub4 returned; } cases[] = {
+        {{7, 8, 7}, OCI_BATCH_ERRORS, 24381, 1}, {{7, 7, 7}, OCI_BATCH_ERRORS, 24381, 1},
+        {{3, 3, 3}, OCI_BATCH_ERRORS, 24381, 0}, {{7, 7, 8}, OCI_DEFAULT, 1, 1}};
+    MustRun("create table t(a number primary key)", "insert into t values(3)");
+    for (const auto& c : cases) {
+        MustRun("delete from t where a > 3");
+        std::array<sb4, 3> in = c.in, back = {};
+        OCIBind* bind = nullptr;
+        MUST(Prepare("insert into t values(:a) returning a into :b"), BindName("a", Int(in)), BindName(&bind, "b", Int(back)));
+        for (const bool again : {false, true}) {    // when all of them are there
+            EXPECT_EQ(Execute(3, c.mode), again && c.mode == OCI_DEFAULT ? 1 : c.answer);
+            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), again ? 0 : c.returned) << in[1] << in[2];
         }
     }
-    EXPECT_EQ(OCILogoff(services[0], err), OCI_SUCCESS);
 }
 
-TEST_F(Executing, LogoffEndsWhatIsOpen) {
-    sb4 value = 0;
-    MUST(Query("select 1 from dual", {Int(value)}, 0), OCILogoff(svc, err));
-    EXPECT_EQ(Fetch(), 3114);
-    EXPECT_EQ(Execute(0), 3114);
-    ASSERT_EQ(Prepare("select 2 from dual"), 0);
-    EXPECT_EQ(Fetch(), 24338) << "a new text was never executed";
+// Counts of elements around the room there is, in and out.
+TEST_F(Executing, TablesAtTheirLimits) {
+    MustRun("create table t(a number primary key)");
+    sb4 in[8] = {1, 2, 3, 4, 5, 6, 7, 8};
+    ub4 current = 6, shorter = 2;
+    ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
+    EXPECT_EQ(Bind(1, Int(in), OCI_DEFAULT, 5, &current), 1414);
+    current = 3;
+    MUST(Bind(1, Int(in), OCI_DEFAULT, 5, &current));
+    EXPECT_EQ(Execute(), 1484) << "in blocks only";
+    MUST(Prepare("begin insert into t values(:1 + :2); end;"));
+    MUST(Bind(1, Int(in), OCI_DEFAULT, 8, &current), Bind(2, Int(in), OCI_DEFAULT, 8, &shorter));
+    EXPECT_EQ(Execute(), 6502) << "tables of two lengths";
+    const struct { ub4 current; sb4 answer; const char* rows; } into[] = {
+        {0, 0, "-"}, {2, 0, "1,2"}, {4, 1414, "-"}, {0xFFFFFFFF, 1414, "-"}, {3, 0, "1,2,3"}};
+    for (const auto& c : into) {
+        MustRun("delete from t");
+        current = 0;
+        MUST(Prepare("begin insert into t values(:1); end;"), Bind(1, Int(in), OCI_DEFAULT, 3, &current));
+        current = c.current;    // as applications set it: before each execute
+        EXPECT_EQ(Execute(), c.answer) << c.current;
+        EXPECT_EQ(One("select group_concat(a) from (select a from t order by a)"), c.rows) << c.current;
+    }
+    sb4 plain = 0;
+    const struct { ub4 most; sb4 answer; std::array<sb4, 4> got; ub4 current; } out[] = {
+        {4, 0, {1, 2, 3, -1}, 3}, {3, 0, {1, 2, 3, -1}, 3}, {2, 1414, {1, 2, -1, -1}, 2}};
+    for (const auto& c : out) {
+        std::array<sb4, 4> got = {-1, -1, -1, -1};
+        MUST(Prepare("begin select a into :1 from t order by a; end;"), Bind(1, Int(got), OCI_DEFAULT, c.most, &(current = 0)));
+        EXPECT_EQ(Execute(), c.answer) << c.most;
+        EXPECT_EQ(current, c.current) << c.most;
+        EXPECT_EQ(got, c.got) << c.most;
+        MUST(Prepare("begin select a, a into :1, :2 from t order by a; end;"), Bind(2, Int(plain)));
+        MUST(Bind(1, Int(got), OCI_DEFAULT, c.most, &(current = 0)));
+        EXPECT_EQ(Execute(), 1414) << "beside a plain bind a table takes one row";
+    }
 }
-
-TEST_F(Executing, RowIdOfTheLastChange) {
-    MustRun("create table t(a number)", "insert into t values(7)", "insert into t values(8)");
-    auto* rowid = NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
-    ASSERT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, rowid, nullptr, OCI_ATTR_ROWID, err)), 0);
-    MUST(Ready("update t set a = 9 where rowid = :r", {{&rowid, 8, SQLT_RDD}}), Execute());
-    EXPECT_EQ(One("select group_concat(a) from t"), "7,9");
-    EXPECT_EQ(One("select a from t where rowid = '" + One("select rowid from t where a = 9") + "'"), "9");
-    char text[19] = "";
-    ASSERT_EQ(Query("select rowid from t where a = 7", {Text(text)}), 0);
-    sb4 length = 0;    // one bind is a row id there and a text here
-    ASSERT_EQ(Prepare("select length(:r) from t where rowid = :r and a = 7"), 0);
-    ASSERT_EQ(BindName("r", Text(text)) + Define(1, Int(length)) + Execute(1), 0);
-    EXPECT_EQ(length, 18);
-    MUST(Ready("delete from t where rowid = :r", {Text(text)}), Execute());
-    EXPECT_EQ(RowCount(), 1u);
-    EXPECT_EQ(Execute(), 0);
-    EXPECT_EQ(RowCount(), 0u);
-    EXPECT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, rowid, nullptr, OCI_ATTR_ROWID, err)), 1410) << "it is gone";
-    std::strcpy(text, "not a row id");
-    EXPECT_EQ(Execute(), 1410);
-}
-
-// ---- Blocks
 
 // What the server says besides comes with a success, in its order; behind a truncation, which is told first.
 TEST_F(Executing, NoticesAreInformation) {
-    MustRun("create table b(a number)", "begin", "insert into b values(1)", "rollback");
     if (!OnServer()) return;
     MustRun("create function told() returns text language plpgsql as "
             "$$ begin raise warning 'one'; raise warning 'two'; return 'abc'; end $$");
@@ -140,10 +101,22 @@ TEST_F(Executing, NoticesAreInformation) {
     }
 }
 
-// What the driver shows its decimal floats with.
-TEST_F(Executing, ValuesIsAQueryOfOneRow) {
-    EXPECT_EQ(One("values( cast( cast('1.50' as decfloat(34)) as varchar(100)))"), OnServer() ? "1.50" : "1.5");
-    EXPECT_EQ(One("values(1, 2)"), "1");
+// The longest value whose length an indicator can tell, and the longest that a length can.
+TEST_F(Executing, LengthsAtTheirLimits) {
+    const struct { int whole; sb4 room; sb4 answer; sb2 indicator; ub2 length; } cases[] = {
+        {32766, 10, 24345, 32766, 10}, {32767, 10, 24345, 32767, 10}, {32768, 10, 24345, -2, 10},
+        {65534, 200000, 0, 0, 65534}, {65535, 200000, 0, 0, 65535}, {65536, 200000, 0, 0, 65535},
+        {100003, 200000, 0, 0, 65535}, {100003, 70000, 24345, -2, 65535}};
+    for (const auto& c : cases) {
+        std::string area(static_cast<std::size_t>(c.room), '#');
+        sb2 indicator = 9;
+        ub2 code = 0, length = 9;
+        EXPECT_EQ(Query("select printf('%.*c', " + std::to_string(c.whole) + ", 'x') from dual",
+                        {{area.data(), c.room, SQLT_CHR, &indicator, &length, &code}}), c.answer)
+            << c.whole << " in " << c.room;
+        EXPECT_EQ(indicator, c.indicator) << c.whole << " in " << c.room;
+        EXPECT_EQ(length, c.length) << c.whole << " in " << c.room;
+    }
 }
 
 }  // namespace

@@ -8,16 +8,11 @@ class PieceByPiece : public StatementTest {
 protected:
     explicit PieceByPiece(ub4 mode = OCI_DEFAULT) : StatementTest(mode) {}
 
-    struct Wanted {
-        dvoid* handle = nullptr;
-        ub4 type = 0;
-        ub1 direction = 0;
-        ub4 iteration = 9, index = 9;
-        ub1 piece = 9;
-    };
+    struct Wanted { dvoid* handle = nullptr; ub4 type = 0; };
     sb4 Get(Wanted& wanted) const {
-        return Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &wanted.direction,
-                                          &wanted.iteration, &wanted.index, &wanted.piece));
+        ub1 direction = 0, piece = 0;
+        ub4 iteration = 0, index = 0;
+        return Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &direction, &iteration, &index, &piece));
     }
     // Gives the place of the next piece.
     sb4 Set(const void* buffer, ub4* length, ub1 piece, sb2* indicator = nullptr, ub2* code = nullptr) const {
@@ -40,35 +35,6 @@ protected:
         ASSERT_EQ(FetchCode(), OCI_NEED_DATA) << sql;
     }
 };
-
-TEST_F(PieceByPiece, ExecuteAsksForEachValueOfEachRow) {
-    MustRun("create table u(a number, b varchar2(100), c raw(10))");
-    sb4 numbers[2] = {1, 2};
-    ASSERT_EQ(Ready("insert into u values(:1, :2, :3)", {Int(numbers), InPieces(SQLT_CHR), InPieces(SQLT_BIN)}), 0);
-    const struct { ub4 iteration; const char* data; ub1 piece; ub1 asked; } steps[] = {
-        {0, "first", OCI_FIRST_PIECE, OCI_ONE_PIECE}, {0, " and last", OCI_LAST_PIECE, OCI_NEXT_PIECE},
-        {0, "\x01\x02", OCI_ONE_PIECE, OCI_ONE_PIECE}, {1, nullptr, OCI_ONE_PIECE, OCI_ONE_PIECE},
-        {1, "\x03", OCI_ONE_PIECE, OCI_ONE_PIECE}};
-    sword rc = ExecuteCode(2);
-    for (const auto& step : steps) {
-        ASSERT_EQ(rc, OCI_NEED_DATA);
-        EXPECT_EQ(Fetch(), 3127) << "an execute is not finished";
-        Wanted wanted;
-        ASSERT_EQ(Get(wanted), 0);
-        EXPECT_EQ(wanted.type, ub4{OCI_HTYPE_BIND});
-        EXPECT_EQ(wanted.direction, OCI_PARAM_IN);
-        EXPECT_EQ(wanted.iteration, step.iteration);
-        EXPECT_EQ(wanted.piece, step.asked);
-        sb2 indicator = step.data ? 0 : -1;
-        ub4 length = step.data ? Size(step.data) : 0;
-        ASSERT_EQ(Set(step.data, &length, step.piece, &indicator), 0);
-        rc = ExecuteCode(2);
-    }
-    EXPECT_EQ(rc, OCI_SUCCESS);
-    EXPECT_EQ(RowCount(), 2u);
-    EXPECT_EQ(One("select group_concat(a || ':' || coalesce(b, '-') || ':' || hex(c), '/') from u"),
-              "1:first and last:0102/2:-:03");
-}
 
 // Other statements of the session insert, select and commit while a row waits for its next piece: its bytes stay.
 TEST_F(PieceByPiece, ARowThatWaitsKeepsItsBytes) {
@@ -118,80 +84,6 @@ TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
         EXPECT_EQ(indicator, c.indicator) << c.whole;
         EXPECT_EQ(code, 1406) << c.whole;
     }
-    char other[4] = "", buffer[3];
-    ub4 length = sizeof buffer;
-    ASSERT_EQ(Query("select 'abcdefgh', 'x' from dual", {InPieces(SQLT_LNG), Text(other)}, 0), 0);
-    ASSERT_EQ(ExecuteCode(1), OCI_NEED_DATA);
-    sb2 indicator = 0;
-    ub2 code = 0;
-    ASSERT_EQ(Set(buffer, &length, OCI_LAST_PIECE, &indicator, &code), 0);
-    EXPECT_EQ(Execute(1), 0) << "the execute that began goes on";
-    EXPECT_EQ(std::string(buffer, length), "abc");
-    EXPECT_EQ(indicator, 8);
-    EXPECT_EQ(code, 1406);
-    EXPECT_STREQ(other, "x");
-    char cut[2] = "";    // beside a value in pieces
-    Begin("select 'ab', 'x' from dual", {Text(cut, &indicator, nullptr, &code), InPieces(SQLT_CHR)});
-    sword rc = 0;
-    EXPECT_EQ(Piece(3, rc), "x");
-    EXPECT_EQ(Answer(rc), 24345);
-}
-
-// A scrollable query, from a position on; one that delivers fewer rows than are asked for stays on the last.
-TEST_F(PieceByPiece, RowsFromAPosition) {
-    sb4 ids[2] = {};
-    ASSERT_EQ(Query("select 'a', 1 from dual union all select 'b', 2 from dual union all select 'c', 3 from dual",
-                    {InPieces(SQLT_CHR), Int(ids)}, 0, OCI_STMT_SCROLLABLE_READONLY), 0);
-    EXPECT_EQ(OCIStmtFetch2(stmt, err, 2, OCI_FETCH_ABSOLUTE, 3, OCI_DEFAULT), OCI_NEED_DATA);
-    sword rc = 0;
-    EXPECT_EQ(Piece(3, rc), "c");
-    EXPECT_EQ(rc, OCI_NO_DATA);
-    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_CURRENT_POSITION), 3u);
-    EXPECT_EQ(OCIStmtFetch2(stmt, err, 1, OCI_FETCH_FIRST, 0, OCI_DEFAULT), OCI_NEED_DATA);
-    EXPECT_EQ(ids[0] * 10 + ids[1], 10) << "no row more";
-}
-
-TEST_F(PieceByPiece, AQueryTakesItsValuesInPieces) {
-    char got[9] = "";
-    ASSERT_EQ(Ready("select :1 || 'c' from dual union all select 'd' from dual", {InPieces(SQLT_CHR)}) + Define(1, Text(got)), 0);
-    for (const ub4 mode : {OCI_EXACT_FETCH, OCI_DEFAULT}) {
-        ASSERT_EQ(ExecuteCode(1, mode), OCI_NEED_DATA);
-        for (const ub1 piece : {OCI_FIRST_PIECE, OCI_LAST_PIECE}) {
-            ub4 length = 1;
-            ASSERT_EQ(Set(piece == OCI_FIRST_PIECE ? "a" : "b", &length, piece), 0);
-            EXPECT_EQ(Execute(1, mode), piece == OCI_FIRST_PIECE ? 3129 : mode == OCI_DEFAULT ? 0 : 1422);
-        }
-        EXPECT_STREQ(got, "abc");
-    }
-    EXPECT_EQ(Fetch(), 0);
-    EXPECT_STREQ(got, "d");
-}
-
-TEST_F(PieceByPiece, ANullWithoutAnyIndicator) {
-    Begin("select null from dual", {InPieces(SQLT_CHR)});
-    sword rc = 0;
-    EXPECT_EQ(Piece(10, rc), "");
-    EXPECT_EQ(Answer(rc), 1405);
-}
-
-// The null of one row is not that of the next; text of a terminated type ends at its zero, other text does not.
-TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
-    MustRun("create table t(a varchar2(10), b raw(10))");
-    ASSERT_EQ(Ready("insert into t values(:1, :2)", {InPieces(SQLT_STR), InPieces(SQLT_BIN)}), 0);
-    sword rc = ExecuteCode(2);
-    for (const sb2 given : {-1, 0}) {
-        for (int column = 0; column < 2; ++column) {
-            ASSERT_EQ(rc, OCI_NEED_DATA);
-            sb2 indicator = given;
-            ub4 length = 4;
-            ASSERT_EQ(Set("ab\0c", &length, OCI_ONE_PIECE, &indicator), 0);
-            rc = ExecuteCode(2);
-        }
-    }
-    ASSERT_EQ(rc, OCI_SUCCESS);
-    EXPECT_EQ(RowCount(), 2u);
-    EXPECT_EQ(One("select group_concat(coalesce(a, '-') || ':' || hex(b), '/') from t"),
-              "-:/ab:61620063");
 }
 
 // What takes part in a waiting operation is freed: the operation is given up.
@@ -214,12 +106,6 @@ TEST_F(PieceByPiece, HandlesThatAreFreedMeanwhile) {
     ub4 length = sizeof first;
     ASSERT_EQ(Answer(OCIStmtSetPieceInfo(defines[0], OCI_HTYPE_DEFINE, err, first, &length, OCI_ONE_PIECE, nullptr, nullptr)), 0);
     EXPECT_EQ(Fetch(), 0) << "nobody is asked for what nobody can be given";
-    ASSERT_EQ(Prepare("select :1 from dual"), 0);
-    OCIBind* bind = nullptr;
-    ASSERT_EQ(Bind(&bind, 1, InPieces(SQLT_CHR)), 0);
-    ASSERT_EQ(ExecuteCode(0), OCI_NEED_DATA);
-    ASSERT_EQ(OCIHandleFree(bind, OCI_HTYPE_BIND), OCI_SUCCESS);
-    EXPECT_EQ(Execute(0), 1008);
 }
 
 // The pieces of one value go out while the define of the next, which the application allocated, is freed: its turn never
@@ -249,30 +135,6 @@ class Utf16Pieces : public PieceByPiece {
 protected:
     Utf16Pieces() : PieceByPiece(OCI_UTF16) {}
 };
-
-// Terminated ones end at their zero, in whatever piece it comes; what is short is held, what is long is not.
-TEST_F(Utf16Pieces, EndAtTheirZero) {
-    MustRun("create table u(c clob)");
-    for (const std::size_t characters : {0, 9'000'000}) {
-        MustRun("delete from u");
-        std::string first;
-        while (first.size() < 2 * characters) (first += 'x') += '\0';
-        const std::string pieces[] = {first + std::string("a\0b", 3), {"\0\0\0c\0", 5}, {"d\0", 2}};
-        ASSERT_EQ(Ready("insert into u values(:1)", {InPieces(SQLT_STR)}), 0);
-        sword rc = ExecuteCode();
-        for (const std::string& piece : pieces) {
-            ASSERT_EQ(rc, OCI_NEED_DATA);
-            ub4 length = Size(piece);
-            const ub1 place = &piece == pieces ? OCI_FIRST_PIECE : length == 2 ? OCI_LAST_PIECE : OCI_NEXT_PIECE;
-            ASSERT_EQ(Set(piece.data(), &length, place), 0);
-            rc = ExecuteCode();
-        }
-        EXPECT_EQ(rc, OCI_SUCCESS);
-        sb4 count = 0;
-        EXPECT_EQ(Query("select length(c) from u", {Int(count)}), 0);
-        EXPECT_EQ(count, static_cast<sb4>(characters) + 2);
-    }
-}
 
 // Two zero bytes close a terminated piece; neither a unit nor a pair of them is torn.
 TEST_F(Utf16Pieces, EndBetweenCharacters) {

@@ -2,6 +2,7 @@
 #include <atomic>
 #include <thread>
 
+#include "support/at_once.h"
 #include "support/statement_fixture.h"
 
 namespace {
@@ -25,23 +26,19 @@ TEST_F(Threads, StatementsOfOneSession) {
         const auto release = [&] { Note(OCIStmtRelease(own.stmt, own.err, nullptr, 0, OCI_DEFAULT)); };
         for (int row = 0; row < kRows; ++row) {
             sb4 value = thread * kRows + row, out = 0;
-            prepare("insert into t values(:1, 'x')");
-            Note(own.Bind(1, Int(value)));
-            Note(own.Execute());
-            release();
-            prepare("select a from t where a = :1");
-            Note(own.Bind(1, Int(value)));
-            Note(own.Define(1, Int(out)));
-            Note(own.Execute());
-            release();
+            for (const char* sql : {"insert into t values(:1, 'x')", "select a from t where a = :1"}) {
+                prepare(sql);
+                Note(own.Bind(1, Int(value)));
+                Note(*sql == 's' ? own.Define(1, Int(out)) : 0);
+                Note(own.Execute());
+                release();
+            }
             Note(out != value);
         }
     };
     ub4 cache = 3;
     ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, &cache, 0, OCI_ATTR_STMTCACHESIZE, err)), 0);
-    std::vector<std::thread> threads;
-    for (int thread = 0; thread < kThreads; ++thread) threads.emplace_back(work, thread);
-    for (std::thread& thread : threads) thread.join();
+    AtOnce(kThreads, work);
     EXPECT_EQ(failures, 0);
     EXPECT_EQ(One("select count(distinct a) from t"), "200");
 }
@@ -108,9 +105,7 @@ TEST_F(Threads, StatementsMoveBetweenSessions) {
             Note(block.Execute());
         }
     };
-    std::thread other(work, 1);
-    work(0);
-    other.join();
+    AtOnce(2, work);
     EXPECT_EQ(failures, 0);
     EXPECT_EQ(OCILogoff(second, err), OCI_SUCCESS);
 }

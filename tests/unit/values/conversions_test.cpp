@@ -1,19 +1,7 @@
 // Conversions between the database's values and the application's elements, through binds and defines of one value.
-#include <limits>
-
 #include "support/statement_fixture.h"
 
 namespace {
-
-std::string Hex(const std::string& bytes) {
-    std::string hex;
-    for (const char byte : bytes) {
-        char pair[3];
-        std::snprintf(pair, sizeof pair, "%02X", static_cast<unsigned char>(byte));
-        hex += pair;
-    }
-    return hex;
-}
 
 template <class T>
 std::string Raw(T value) { return {reinterpret_cast<const char*>(&value), sizeof value}; }
@@ -22,17 +10,6 @@ class Conversions : public StatementTest {
 protected:
     using StatementTest::StatementTest;
 
-    // What a define of `size` bytes holds after fetching an expression: bytes as the type lays them, or "!" and a
-    // number.
-    std::string Out(const std::string& expression, ub2 type, sb4 size) {
-        std::string area(static_cast<std::size_t>(size), '#');
-        ub2 code = 0;
-        length_ = 0;
-        indicator_ = 9;
-        const sb4 answer = Query("select " + expression + " from dual",
-                                 {{area.data(), size, type, &indicator_, &length_, &code}});
-        return answer == 0 || answer == 24345 ? area : "!" + std::to_string(answer);
-    }
     // What the database sees of an element.
     std::string In(const std::string& area, ub2 type, const std::string& seen_through = "quote(:1)") {
         std::string copy = area;
@@ -45,29 +22,8 @@ protected:
         if (answer != 0) return "!" + std::to_string(answer);
         return indicator == -1 ? "-" : text;
     }
-
-    ub2 length_ = 0;
-    sb2 indicator_ = 0;
+    alignas(16) char area_[16] = "no such object!";
 };
-
-TEST_F(Conversions, DatetimeDescriptors) {
-    auto* datetime = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
-    const std::string element = Raw(datetime);
-    EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!1866") << "never set";
-    const char* const query = "select timestamp '2024-02-29 13:05:07.5' from dual";
-    ASSERT_EQ(Query(query, {{&datetime, 8, SQLT_TIMESTAMP}}), 0);
-    EXPECT_EQ(In(element, SQLT_TIMESTAMP), "'2024-02-29 13:05:07.5'");
-    ub2 length = 0;
-    ASSERT_EQ(Query(query, {{&datetime, 8, SQLT_TIMESTAMP, nullptr, &length}}), 0);
-    EXPECT_EQ(length, 8);
-    void* const wrong[] = {nullptr, stmt, this};
-    for (void* pointer : wrong) {
-        EXPECT_EQ(In(Raw(pointer), SQLT_TIMESTAMP), "!21710");
-        EXPECT_EQ(Query(query, {{&pointer, 8, SQLT_DATE}}), 21710);
-    }
-    EXPECT_EQ(OCIDescriptorFree(datetime, OCI_DTYPE_TIMESTAMP), OCI_SUCCESS);
-    EXPECT_EQ(In(element, SQLT_TIMESTAMP), "!21710") << "freed";
-}
 
 TEST_F(Conversions, ATimeAloneIsNoDate) {
     auto* time = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIME);
@@ -88,8 +44,6 @@ TEST_F(Conversions, IntervalColumns) {
     auto* days = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_DS), "!1867") << "never set";
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_YM), "!932") << "the other span";
-    EXPECT_EQ(In(Raw(stmt), SQLT_INTERVAL_YM), "!21710");
-    EXPECT_EQ(Query("select '1 0:0:0' from dual", {{&stmt, 8, SQLT_INTERVAL_DS}}), 21710);
     MustRun("create table spans(ym interval year to month, ds interval day to second, n number)");
     const struct { const char *ym, *ds; } cases[] = {
         {"+01-02", "+01 02:03:04.500000"}, {"-99-11", "-99 23:59:59.999499"}, {"+00-00", "+00 00:00:00.000000"}};
@@ -134,30 +88,34 @@ TEST_F(Conversions, IntervalColumns) {
     for (const auto& c : server) EXPECT_EQ(One(c.sql), c.answer) << c.sql;
 }
 
-TEST_F(Conversions, StringsAndRaws) {
-    OCIString* string = nullptr;
-    OCIRaw* raw = nullptr;
-    ASSERT_EQ(Query("select 'abc', x'00FF' from dual", {{&string, 8, SQLT_VST}, {&raw, 8, SQLT_LVB}}), 0);
-    EXPECT_EQ(std::string(reinterpret_cast<char*>(OCIStringPtr(env, string)), OCIStringSize(env, string)), "abc");
-    EXPECT_EQ(Hex(std::string(reinterpret_cast<char*>(OCIRawPtr(env, raw)), OCIRawSize(env, raw))), "00FF");
-    EXPECT_EQ(In(Raw(string), SQLT_VST), "'abc'");
-    EXPECT_EQ(In(Raw(raw), SQLT_LVB), "X'00FF'");
-    EXPECT_EQ(In(Raw<void*>(nullptr), SQLT_VST), "NULL");
-    EXPECT_EQ(In(Raw(raw), SQLT_VST), "!21710");
-    EXPECT_EQ(Query("select 'abc' from dual", {{&raw, 8, SQLT_VST}}), 21710);
-}
-
 TEST_F(Conversions, RowIdsOfTexts) {
+    char area[11] = "";
     auto* place = NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID);
-    const struct { const char *expression, *hex; } cases[] = {
-        {"' AAAP//AAAAAAAAAAAB '", "FFFF0000000000000001"}, {"'AAAQAAAAAAAAAAAAAB'", "!1410"}, {"'AAAAAAAAAAAAAAAAA'", "!1410"}};
-    for (const auto& c : cases) {
-        const std::string area = Out(c.expression, SQLT_RID, 10);
-        EXPECT_EQ(area[0] == '!' ? area : Hex(area), c.hex) << c.expression;
-        EXPECT_EQ(length_, area[0] == '!' ? 0 : 10) << c.expression;
-    }
+    ASSERT_EQ(Query("select ' AAAP//AAAAAAAAAAAB ' from dual", {{area, 10, SQLT_RID}}), 0);
+    EXPECT_EQ(std::string_view(area, 11), std::string_view("\xFF\xFF\0\0\0\0\0\0\0\1\0", 11));
+    for (const char* text : {"AAAQAAAAAAAAAAAAAB", "AAAAAAAAAAAAAAAAA"})
+        EXPECT_EQ(Query(std::string("select '") + text + "' from dual", {{area, 10, SQLT_RID}}), 1410);
     ASSERT_EQ(Query("select 'AAAQAAAAAAAAAAAAAB' from dual", {{&place, 8, SQLT_RDD}}), 0);
     EXPECT_EQ(In(Raw(place), SQLT_RDD), "!1410") << "a table that no engine numbers so";
+}
+
+// Places whose pointers are to other objects, to none, and to one that is freed.
+TEST_F(Conversions, ObjectsOfAnotherKind) {
+    auto* datetime = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
+    EXPECT_EQ(In(Raw(datetime), SQLT_TIMESTAMP), "!1866") << "never set";
+    OCIDescriptorFree(datetime, OCI_DTYPE_TIMESTAMP);
+    OCIRaw* raw = nullptr;
+    ASSERT_EQ(Query("select x'00FF' from dual", {{&raw, 8, SQLT_LVB}}), 0);
+    const struct { ub2 type; const char *query, *null; } cases[] = {
+        {SQLT_VST, "select 'abc' from dual", "NULL"}, {SQLT_INTERVAL_DS, "select '1 0:0:0' from dual", "!21710"},
+        {SQLT_TIMESTAMP, "select timestamp '2024-02-29 13:05:07.5' from dual", "!21710"}};
+    for (const auto& c : cases) {
+        EXPECT_EQ(In(Raw<void*>(nullptr), c.type), c.null) << c.type;
+        for (void* wrong : {static_cast<void*>(raw), static_cast<void*>(stmt), static_cast<void*>(datetime), static_cast<void*>(area_)}) {
+            EXPECT_EQ(In(Raw(wrong), c.type), "!21710") << c.type;
+            EXPECT_EQ(Query(c.query, {{&wrong, 8, c.type}}), 21710) << c.type;
+        }
+    }
 }
 
 class Utf16Conversions : public Conversions {
@@ -166,15 +124,8 @@ protected:
 };
 
 TEST_F(Utf16Conversions, TextsOfTheCallsAreUtf16) {
-    ASSERT_EQ(Prepare("select :name as col from dual where"), 0);
-    OraText* text = nullptr;
-    ub4 length = 0;
-    ASSERT_EQ(Answer(OCIAttrGet(stmt, OCI_HTYPE_STMT, &text, &length, OCI_ATTR_STATEMENT, err)), 0);
-    EXPECT_EQ(length, 70u);
     char value[8] = "";
-    ASSERT_EQ(BindName(":Name", Text(value)), 0);
-    EXPECT_EQ(Execute(0), 921);
-    EXPECT_EQ(Attribute<ub2>(OCI_ATTR_PARSE_ERROR_OFFSET) % 2, 0) << "bytes of whole units";
+    MUST(Prepare("select :name as col from dual where"), BindName(":Name", Text(value)));
     OraText* names[1];
     ub1 lengths[1];
     sb4 found = 0;
