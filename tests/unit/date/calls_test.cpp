@@ -37,48 +37,31 @@ protected:
     }
 };
 
-TEST_F(DateCalls, TheDateOfToday) {
-    OCIDate today{};
-    EXPECT_EQ(Answer(OCIDateSysDate(err_, &today)), 0);
-    EXPECT_GT(today.OCIDateYYYY, 2000);
-}
-
 TEST_F(DateCalls, TextsAreWrittenToTheByte) {
     const OCIDate day = Date(2024, 2, 9);
     char area[12] = "...........";
     ub4 size = 9;
     EXPECT_EQ(Answer(OCIDateToText(err_, &day, nullptr, 0, nullptr, 0, &size, Text(area))), 0);
     EXPECT_STREQ(area, "09-FEB-24..");
-    EXPECT_EQ(size, 9u);
-    EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text("FF"), 2, nullptr, 0, &size, Text(area))), 1821);
     size = 8;
     EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text("YYYY-MM-DD"), 10, nullptr, 0, &size, Text(area))), 22059);
     EXPECT_EQ(size, 10u);
     EXPECT_STREQ(area, "09-FEB-24..");
-    std::string model;
+    std::string model, long_text(20000, '\0');
     while (model.size() <= 248) model += "JSPTH ";
-    std::string long_text(20000, '\0');
     size = 20000;
     EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text(model), static_cast<ub1>(model.size()), Text("FRENCH"), 6, &size,
                                    Text(long_text))), 0);
     EXPECT_GT(size, 2500u);
-    EXPECT_EQ(Answer(OCIDateToText(err_, &day, nullptr, 0, Text("ELVISH"), 6, &size, Text(area))), 12705);
     // Lengths beyond the closing zero do no harm.
     OCIDate out{};
     EXPECT_EQ(Answer(OCIDateFromText(err_, Text("29/02/2024"), kHuge, Text("DD/MM/YYYY"), 255, nullptr, 0, &out)), 0);
     EXPECT_EQ(out.OCIDateYYYY, 2024);
-}
-
-TEST_F(DateCalls, TextsInUtf16AreWrittenToTheByte) {
     Reopen(OCI_UTF16);
-    const OCIDate day = Date(2024, 3, 9);
-    char16_t area[10] = u"?????????";
-    ub4 size = 18;
-    EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text(u"FMDD MONTH"), 20, Text(u"german"), 12, &size, Text(area))), 0);
-    EXPECT_EQ(size, 12u);
-    EXPECT_EQ(std::u16string(area), u"9 MÄRZ???");
-    OCIDate out{};
-    EXPECT_EQ(Answer(OCIDateFromText(err_, Text(u"\xD800x"), 4, nullptr, 0, nullptr, 0, &out)), 24501);
+    char16_t units[10] = u"?????????";
+    size = 18;
+    EXPECT_EQ(Answer(OCIDateToText(err_, &day, Text(u"FMDD MONTH"), 20, Text(u"german"), 12, &size, Text(units))), 0);
+    EXPECT_EQ(std::u16string(units), u"9 FEBRUAR");
 }
 
 TEST_F(DateCalls, TypesHaveTheirParts) {
@@ -102,12 +85,8 @@ TEST_F(DateCalls, TypesHaveTheirParts) {
         EXPECT_EQ(Answer(Construct(value, "+02:00", 250000000)), 0) << c.type;
         EXPECT_EQ(DateOf(value), c.date) << c.type;
         EXPECT_EQ(TimeOf(value), c.time) << c.type;
-        EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, 2000, 2, 30)), has_date ? 1839 : 1878) << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, -44, 3, 15)), has_date ? 0 : 1878) << c.type;
-        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 999999999)), has_time ? 0 : 1878) << c.type;
-        EXPECT_EQ(TimeOf(value), has_time ? "1:2:3.999999999" : "1878") << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 4)), has_time ? 0 : 1878) << c.type;
-        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 1000000000)), 1880) << c.type;
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 24, 2, 3, 4)), has_time ? 1850 : 1878) << c.type;
         ub4 flags = 1;
         EXPECT_EQ(Answer(OCIDateTimeCheckNS(env_, err_, value, &flags)), 0) << c.type;
@@ -120,32 +99,27 @@ TEST_F(DateCalls, TypesHaveTheirParts) {
     }
 }
 
+// What comes of a moment of +05:30 in each type, and of that in a moment without a zone.
 TEST_F(DateCalls, AssignmentKeepsTheTypesParts) {
-    OCIDateTime* stamp = NewDateTime(OCI_DTYPE_TIMESTAMP);
+    const struct { ub4 type; const char *date, *time; sb4 zone, back; } cases[] = {
+        {OCI_DTYPE_DATE, "2024-7-15", "1878", 1878, 0}, {OCI_DTYPE_TIME, "1878", "13:14:15.5", 1878, 1878},
+        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.5", 1878, 0}, {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.5", 0, 0}};
     OCIDateTime* zoned = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
-    OCIDateTime* day = NewDateTime(OCI_DTYPE_DATE);
-    OCIDateTime* time = NewDateTime(OCI_DTYPE_TIME);
-    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, stamp, day)), 1866);
-    MUST(Answer(Construct(zoned, "Asia/Kolkata", 5)), Answer(OCIDateTimeAssign(env_, err_, zoned, stamp)));
-    EXPECT_EQ(TimeOf(stamp), "13:14:15.5");
     sb1 hour = 0, minute = 0;
-    sword order = 9;
-    SHOULD(Answer(OCI_datetimeSetDate(env_, err_, stamp, 2024, 1, 1)));    // no region is left that it could fetch
-    EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, stamp, &hour, &minute)), 1878);
-    for (const char* zone : {"+05:30", "-08:00"}) {
-        OCIDateTime* local = NewDateTime(OCI_DTYPE_TIMESTAMP_LTZ);
-        MUST(Answer(Construct(zoned, zone, 5)), Answer(OCIDateTimeAssign(env_, err_, zoned, local)));
-        EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, zoned, local, &order)), 0);
-        EXPECT_EQ(order, 0) << zone << ": the same moment";
+    MUST(Answer(Construct(zoned, "Asia/Kolkata", 5)));
+    for (const auto& c : cases) {
+        OCIDateTime* value = NewDateTime(c.type);
+        OCIDateTime* stamp = NewDateTime(OCI_DTYPE_TIMESTAMP);
+        SHOULD(Answer(OCIDateTimeAssign(env_, err_, zoned, value)), Answer(OCIDateTimeAssign(env_, err_, value, value)));
+        EXPECT_EQ(DateOf(value), c.date) << c.type;
+        EXPECT_EQ(TimeOf(value), c.time) << c.type;
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), c.zone) << c.type;
+        EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, value, stamp)), c.back) << c.type;
     }
-    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, day)), 0);
-    EXPECT_EQ(DateOf(day), "2024-7-15");
-    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, zoned, time)), 0);
-    EXPECT_EQ(TimeOf(time), "13:14:15.5");
-    EXPECT_EQ(Answer(OCIDateTimeAssign(env_, err_, time, stamp)), 1878);
-    SHOULD(Answer(OCIDateTimeAssign(env_, err_, time, time)), Answer(OCIDateTimeAssign(env_, err_, zoned, zoned)),
-           Answer(OCIDateTimeAssign(env_, err_, stamp, zoned)),
-           Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, zoned, &hour, &minute)));
+    OCIDateTime* local = NewDateTime(OCI_DTYPE_TIMESTAMP_LTZ);
+    sword order = 9;
+    SHOULD(Answer(OCIDateTimeAssign(env_, err_, zoned, local)), Answer(OCIDateTimeCompare(env_, err_, zoned, local, &order)));
+    EXPECT_EQ(order, 0) << "the same moment";
 }
 
 TEST_F(DateCalls, TimesAloneAreComparedWithTheirLike) {

@@ -30,24 +30,20 @@ std::string Parse(std::string_view text, std::string_view model, const char* lan
 TEST(DateFromText, MissingFieldsAreOfToday) {
     DateTime now, value;
     ASSERT_EQ(Now(&now), 0);
-    ASSERT_EQ(FromText("13:14", "HH24:MI", kEnglish, Scope::date, &value), 0);
-    EXPECT_EQ(value.year, now.year);
-    EXPECT_EQ(value.month, now.month);
-    EXPECT_EQ(value.day, 1);
-    ASSERT_EQ(FromText("02-03", "MM-DD", kEnglish, Scope::date, &value), 0);
-    EXPECT_EQ(value.year, now.year);
     const int century = now.year - now.year % 100;
-    ASSERT_EQ(FromText("01-01-07", "DD-MM-YY", kEnglish, Scope::date, &value), 0);
-    EXPECT_EQ(value.year, century + 7);
-    ASSERT_EQ(FromText("0412", "YYMM", kEnglish, Scope::date, &value), 0);    // four digits, but a number follows
-    EXPECT_EQ(value.year, century + 4);
-    EXPECT_EQ(value.month, 12);
-    // RR: the year of those two digits in the half of a century that lies nearer.
-    const bool first_half = now.year % 100 < 50;
-    ASSERT_EQ(FromText("01-01-49", "DD-MM-RR", kEnglish, Scope::date, &value), 0);
-    EXPECT_EQ(value.year, century + 49 + (first_half ? 0 : 100));
-    ASSERT_EQ(FromText("01-01-50", "DD-MM-RR", kEnglish, Scope::date, &value), 0);
-    EXPECT_EQ(value.year, century + 50 - (first_half ? 100 : 0));
+    const bool first_half = now.year % 100 < 50;    // RR: of the years with those digits the one that lies nearer
+    const struct { const char *text, *model; int year, month, day; } cases[] = {
+        {"13:14", "HH24:MI", now.year, now.month, 1}, {"02-03", "MM-DD", now.year, 2, 3},
+        {"01-01-07", "DD-MM-YY", century + 7, 1, 1},
+        {"0412", "YYMM", century + 4, 12, 1},    // four digits, but a number follows
+        {"01-01-49", "DD-MM-RR", century + 49 + (first_half ? 0 : 100), 1, 1},
+        {"01-01-50", "DD-MM-RR", century + 50 - (first_half ? 100 : 0), 1, 1}};
+    for (const auto& c : cases) {
+        ASSERT_EQ(FromText(c.text, c.model, kEnglish, Scope::date, &value), 0) << c.text;
+        EXPECT_EQ(value.year, c.year) << c.text;
+        EXPECT_EQ(value.month, c.month) << c.text;
+        EXPECT_EQ(value.day, c.day) << c.text;
+    }
 }
 
 // What a model writes in full it reads back, exactly and not.

@@ -6,34 +6,17 @@
 
 namespace {
 
-// Runs `function` and compares error or bytes with what the exact result must be rounded to.
-void ExpectRounded(const char* name, number::Errno error, const OCINumber& got, Fraction& exact,
-                   const std::string& operands) {
-    OCINumber wanted;
-    const number::Errno wanted_error = exact.Rounded(&wanted);
-    ASSERT_EQ(error, wanted_error) << name << " " << operands;
-    if (!error) {
-        ASSERT_EQ(got, wanted) << name << " " << operands;
-    }
-}
-
 // Two numbers of 40 digits; what their product has behind its 40th digit is 50...01 or 49...9.
 void NextToTie(RandomNumbers& numbers, OCINumber* a, OCINumber* b) {
     std::string digits = "9";
     while (digits.size() < 39) digits += static_cast<char>('0' + numbers.Below(10));
     digits += '7';
     *a = Number(digits);
-    mpz_t inverse, product, power;
-    mpz_init_set_str(inverse, digits.c_str(), 10);
-    mpz_init_set_str(product, numbers.Below(4) ? "5000000000000000000000000000000000000001"
-                                               : "4999999999999999999999999999999999999999", 10);
-    mpz_init_set_str(power, "10000000000000000000000000000000000000000", 10);
-    mpz_invert(inverse, inverse, power);
-    mpz_mul(product, product, inverse);
-    mpz_mod(product, product, power);
-    char text[45];
-    *b = Number(mpz_get_str(text, 10, product));
-    mpz_clears(inverse, product, power, nullptr);
+    const mpz_class power("1" + std::string(40, '0'));
+    const mpz_class tail(numbers.Below(4) ? "5" + std::string(38, '0') + "1" : "4" + std::string(39, '9'));
+    mpz_class inverse(digits);
+    mpz_invert(inverse.get_mpz_t(), inverse.get_mpz_t(), power.get_mpz_t());
+    *b = Number(mpz_class(tail * inverse % power).get_str());
 }
 
 }  // namespace
@@ -54,11 +37,12 @@ TEST(NumberArithmetic, FourOperationsRoundTheExactResultOnce) {
         if (i % 20 == 4) NextToTie(numbers, &a, &b);
         if (i % 5 == 1 && number::Mul(numbers.Next(spread), b, &a) != 0) a = b;    // next to a short quotient
         for (const auto& operation : operations) {
-            Fraction left(a), right(b), exact;
-            operation.exact(exact, left, right);
-            OCINumber got;
-            const number::Errno error = operation.function(a, b, &got);
-            ASSERT_NO_FATAL_FAILURE(ExpectRounded(operation.name, error, got, exact, Shown(a) + " " + Shown(b)));
+            mpq_class exact;
+            operation.exact(exact.get_mpq_t(), Exact(a).get_mpq_t(), Exact(b).get_mpq_t());
+            OCINumber got, wanted;
+            const number::Errno wanted_error = Rounded(exact, &wanted);
+            ASSERT_NO_FATAL_FAILURE(ExpectResult(operation.name + (" " + Shown(a) + " ") + Shown(b),
+                                                 operation.function(a, b, &got), got, wanted_error, wanted));
         }
     }
 }

@@ -2,8 +2,10 @@
 // fraction must be rounded to, worked out with whole numbers alone.
 #pragma once
 
-#include <gmp.h>
+#include <gmpxx.h>
+#include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <cstring>
 #include <random>
 #include <string>
@@ -28,89 +30,62 @@ inline OCINumber Number(std::string_view literal) {
     return value;
 }
 
-// An exact fraction.
-class Fraction {
-public:
-    Fraction() { mpq_init(value_); }
-    explicit Fraction(const OCINumber& value) : Fraction() {
-        const int count = value.OCINumberPart[0];
-        const bool negative = value.OCINumberPart[1] < 128;
-        if (count == 1) return;
-        int last = 0;
-        for (int i = 2; i <= count; ++i) {
-            const int byte = value.OCINumberPart[i];
-            if (negative && byte == 102) break;
-            mpz_mul_ui(mpq_numref(value_), mpq_numref(value_), 100);
-            mpz_add_ui(mpq_numref(value_), mpq_numref(value_),
-                       static_cast<unsigned long>(negative ? 101 - byte : byte - 1));
-            last = i;
-        }
-        Scale((negative ? 62 - value.OCINumberPart[1] : value.OCINumberPart[1] - 193) - (last - 2));
-        if (negative) mpq_neg(value_, value_);
-    }
-    ~Fraction() { mpq_clear(value_); }
-    Fraction(const Fraction&) = delete;
-    Fraction& operator=(const Fraction&) = delete;
-    operator mpq_ptr() { return value_; }
+// Lays out digits of base 100, of which the first and the last are not 0.
+inline OCINumber Composed(const int* digits, int count, int exponent, bool negative) {
+    OCINumber value{};
+    ub1* bytes = value.OCINumberPart;
+    const bool closed = negative && count < 20;
+    bytes[0] = static_cast<ub1>(count + 1 + closed);
+    bytes[1] = static_cast<ub1>(negative ? 62 - exponent : 193 + exponent);
+    for (int i = 0; i < count; ++i) bytes[2 + i] = static_cast<ub1>(negative ? 101 - digits[i] : digits[i] + 1);
+    if (closed) bytes[2 + count] = 102;
+    return value;
+}
 
-    // Multiplies by 100^power.
-    void Scale(int power) {
-        mpq_t factor;
-        mpq_init(factor);
-        mpz_ui_pow_ui(mpq_numref(factor), 100, static_cast<unsigned long>(power < 0 ? -power : power));
-        if (power < 0)
-            mpq_div(value_, value_, factor);
-        else
-            mpq_mul(value_, value_, factor);
-        mpq_clear(factor);
-    }
+inline mpq_class Hundreds(int power) {
+    mpz_class scale;
+    mpz_ui_pow_ui(scale.get_mpz_t(), 100, static_cast<unsigned long>(std::abs(power)));
+    return power < 0 ? mpq_class(1, scale) : mpq_class(scale);
+}
 
-    // The nearest number of 20 base-100 digits, half away from zero; or the error for its range.
-    number::Errno Rounded(OCINumber* result) {
-        std::memset(result, 0, sizeof *result);
-        const int sign = mpq_sgn(value_);
-        if (sign == 0) {
-            *result = OCINumber{{1, 128}};
-            return 0;
-        }
-        mpq_abs(value_, value_);
-        int exponent = 0;
-        while (mpq_cmp_ui(value_, 100, 1) >= 0) Scale(-1), ++exponent;
-        while (mpq_cmp_ui(value_, 1, 1) < 0) Scale(1), --exponent;
-        Scale(19);
-        mpz_t whole, limit;
-        mpz_inits(whole, limit, nullptr);
-        mpz_mul_ui(whole, mpq_numref(value_), 2);  // floor(value + 1/2)
-        mpz_add(whole, whole, mpq_denref(value_));
-        mpz_fdiv_q(whole, whole, mpq_denref(value_));
-        mpz_fdiv_q_ui(whole, whole, 2);
-        mpz_ui_pow_ui(limit, 100, 20);
-        if (mpz_cmp(whole, limit) >= 0) {
-            mpz_fdiv_q_ui(whole, whole, 100);
-            ++exponent;
-        }
-        unsigned long digits[20];
-        for (int i = 19; i >= 0; --i) digits[i] = mpz_fdiv_q_ui(whole, whole, 100);
-        mpz_clears(whole, limit, nullptr);
-        if (exponent > 62) return 22053;
-        if (exponent < -65) return 22054;
-        Write(digits, exponent, sign < 0, result);
-        return 0;
-    }
+inline mpq_class Exact(const OCINumber& value) {
+    const int count = value.OCINumberPart[0];
+    const bool negative = value.OCINumberPart[1] < 128;
+    mpz_class digits;
+    int last = 2;
+    for (; last <= count && !(negative && value.OCINumberPart[last] == 102); ++last)
+        digits = digits * 100 + (negative ? 101 - value.OCINumberPart[last] : value.OCINumberPart[last] - 1);
+    const int exponent = negative ? 62 - value.OCINumberPart[1] : value.OCINumberPart[1] - 193;
+    return count == 1 ? mpq_class() : mpq_class(negative ? -digits : digits) * Hundreds(exponent - (last - 3));
+}
 
-private:
-    static void Write(const unsigned long (&digits)[20], int exponent, bool negative, OCINumber* result) {
-        int count = 20;
-        while (digits[count - 1] == 0) --count;
-        ub1* bytes = result->OCINumberPart;
-        bytes[0] = static_cast<ub1>(count + 1 + (negative && count < 20));
-        bytes[1] = static_cast<ub1>(negative ? 62 - exponent : 193 + exponent);
-        for (int i = 0; i < count; ++i) bytes[2 + i] = static_cast<ub1>(negative ? 101 - digits[i] : digits[i] + 1);
-        if (negative && count < 20) bytes[2 + count] = 102;
-    }
+// The nearest number of 20 base-100 digits, half away from zero; or the error for its range.
+inline number::Errno Rounded(mpq_class value, OCINumber* result) {
+    *result = OCINumber{{1, 128}};
+    const int sign = sgn(value);
+    if (sign == 0) return 0;
+    value = abs(value);
+    int exponent = 0;
+    while (value >= 100) value /= 100, ++exponent;
+    while (value < 1) value *= 100, --exponent;
+    value *= Hundreds(19);
+    mpz_class whole = (value.get_num() * 2 + value.get_den()) / value.get_den() / 2;    // floor(value + 1/2)
+    if (whole >= Hundreds(20)) whole /= 100, ++exponent;
+    int digits[20], count = 20;
+    for (int i = 19; i >= 0; --i) digits[i] = static_cast<int>(mpz_fdiv_q_ui(whole.get_mpz_t(), whole.get_mpz_t(), 100));
+    while (digits[count - 1] == 0) --count;
+    *result = Composed(digits, count, exponent, sign < 0);
+    return exponent > 62 ? 22053 : exponent < -65 ? 22054 : 0;
+}
 
-    mpq_t value_;
-};
+// What a function answered, and what it should have.
+inline void ExpectResult(const std::string& what, number::Errno error, const OCINumber& got, number::Errno wanted_error,
+                         const OCINumber& wanted) {
+    ASSERT_EQ(error, wanted_error) << what;
+    if (!error) {
+        ASSERT_EQ(got, wanted) << what;
+    }
+}
 
 // Random numbers whose digits are often 0, 1, 49, 50 or 99, where carries and roundings happen.
 class RandomNumbers {
@@ -126,17 +101,12 @@ public:
         const int count = kCounts[Below(8)];
         const bool negative = Below(3) == 0, awkward = Below(2) == 0;
         const int exponent = Below(2 * spread + 1) - spread;
-        OCINumber value{};
-        ub1* bytes = value.OCINumberPart;
+        int digits[20];
         for (int i = 0; i < count; ++i) {
-            int digit = awkward ? kAwkward[Below(5)] : Below(100);
-            if (digit == 0 && (i == 0 || i == count - 1)) digit = 1;
-            bytes[2 + i] = static_cast<ub1>(negative ? 101 - digit : digit + 1);
+            digits[i] = awkward ? kAwkward[Below(5)] : Below(100);
+            if (digits[i] == 0 && (i == 0 || i == count - 1)) digits[i] = 1;
         }
-        bytes[0] = static_cast<ub1>(count + 1 + (negative && count < 20));
-        bytes[1] = static_cast<ub1>(negative ? 62 - exponent : 193 + exponent);
-        if (negative && count < 20) bytes[2 + count] = 102;
-        return value;
+        return Composed(digits, count, exponent, negative);
     }
 
 private:
