@@ -1,11 +1,7 @@
 // Loading the client library: which one, what is said when it or a function is missing, what stands in for it.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <cstdlib>
-#include <filesystem>
-#include <fstream>
-#include <sstream>
 #include <string>
 
 #include "platform/client_library.h"
@@ -83,23 +79,6 @@ TEST_F(Loader, TheSwitchMayHaveAnotherName) {
     unsetenv("HARNIX_XA_SWITCH");
     EXPECT_NE(XaSwitch(), nullptr);
     EXPECT_EQ(Call(&xa_switch_t::xa_close_entry, nullptr, 1, 0), XA_OK);
-}
-
-TEST_F(Loader, TheTraceListsEveryCandidateAndTheReason) {
-    const std::filesystem::path trace = std::filesystem::temp_directory_path() / ("trace." + std::to_string(getpid()));
-    setenv("HARNIX_TRACE_LOAD", trace.c_str(), 1);
-    const auto traced = [&](const char* library) {
-        Use(library);
-        LoadClientLibrary();
-        ForgetClientLibrary();
-        std::ostringstream content;
-        content << std::ifstream(trace).rdbuf();
-        std::filesystem::remove(trace);
-        return content.str();
-    };
-    const std::string said = ": ./no_such.so: cannot open shared object file: No such file or directory\n";
-    EXPECT_EQ(traced("./no_such.so"), "./no_such.so (now)" + said + "./no_such.so (lazy)" + said);
-    EXPECT_EQ(traced(PROBE_LIBRARY), PROBE_LIBRARY " (now): loaded\n");
 }
 
 }  // namespace
