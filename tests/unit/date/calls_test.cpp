@@ -103,14 +103,16 @@ TEST_F(DateCalls, TypesHaveTheirParts) {
 TEST_F(DateCalls, AssignmentKeepsTheTypesParts) {
     const struct { ub4 type; const char *date, *time; sb4 zone, back; } cases[] = {
         {OCI_DTYPE_DATE, "2024-7-15", "1878", 1878, 0}, {OCI_DTYPE_TIME, "1878", "13:14:15.5", 1878, 1878},
-        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.5", 1878, 0}, {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.5", 0, 0}};
+        {OCI_DTYPE_TIMESTAMP, "2024-7-15", "13:14:15.5", 1878, 0},
+        {OCI_DTYPE_TIMESTAMP_TZ, "2024-7-15", "13:14:15.5", 0, 0}};
     OCIDateTime* zoned = NewDateTime(OCI_DTYPE_TIMESTAMP_TZ);
     sb1 hour = 0, minute = 0;
     MUST(Answer(Construct(zoned, "Asia/Kolkata", 5)));
     for (const auto& c : cases) {
         OCIDateTime* value = NewDateTime(c.type);
         OCIDateTime* stamp = NewDateTime(OCI_DTYPE_TIMESTAMP);
-        SHOULD(Answer(OCIDateTimeAssign(env_, err_, zoned, value)), Answer(OCIDateTimeAssign(env_, err_, value, value)));
+        SHOULD(Answer(OCIDateTimeAssign(env_, err_, zoned, value)),
+               Answer(OCIDateTimeAssign(env_, err_, value, value)));
         EXPECT_EQ(DateOf(value), c.date) << c.type;
         EXPECT_EQ(TimeOf(value), c.time) << c.type;
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), c.zone) << c.type;
@@ -118,7 +120,8 @@ TEST_F(DateCalls, AssignmentKeepsTheTypesParts) {
     }
     OCIDateTime* local = NewDateTime(OCI_DTYPE_TIMESTAMP_LTZ);
     sword order = 9;
-    SHOULD(Answer(OCIDateTimeAssign(env_, err_, zoned, local)), Answer(OCIDateTimeCompare(env_, err_, zoned, local, &order)));
+    SHOULD(Answer(OCIDateTimeAssign(env_, err_, zoned, local)),
+           Answer(OCIDateTimeCompare(env_, err_, zoned, local, &order)));
     EXPECT_EQ(order, 0) << "the same moment";
 }
 

@@ -41,7 +41,9 @@ TEST_F(Texts, ConvertToUtf16) {
     for (const auto& c : cases) {
         std::string area(c.capacity, 'x');
         uint32_t length = 0;
-        Printed([&] { EXPECT_EQ(convertToUTF16(Token(c.input), c.length, area.data(), c.capacity, &length), c.result) << c.input; });
+        int result = 77;
+        Printed([&] { result = convertToUTF16(Token(c.input), c.length, area.data(), c.capacity, &length); });
+        EXPECT_EQ(result, c.result) << c.input;
         EXPECT_EQ(area.substr(0, length), c.output) << c.input;
     }
     char area[4] = "xxx";

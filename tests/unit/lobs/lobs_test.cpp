@@ -86,7 +86,7 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     EXPECT_EQ(taken, "3ab") << "in room of the library's own";
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 7), 1, room, 4, &(taken = "!"), Takes, 0, 0)), 24802);
     EXPECT_EQ(amount, 7u) << "a failure tells of none";
-    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 24802);
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &amount, 1, room, 8, OCI_FIRST_PIECE, &pieces, Gives, 0, 0)), 24802);
     const struct { ub4 length; ub1 piece; sb4 answer; } odd[] = {
         {9, OCI_LAST_PIECE, 24801}, {1, OCI_LAST_PIECE + 1, 24801}, {1, OCI_ONE_PIECE, 0}};
     for (const auto& c : odd) {
@@ -171,7 +171,7 @@ TEST_F(Lobs, TwoLocatorsOfOneValue) {
     EXPECT_EQ(Stored(), "\xC3\xB6\xC3\xA4llo");
 }
 
-// Places that the calls want and scripts always give; amounts of the wider calls, of which characters come before bytes.
+// Places that the calls want and scripts always give; amounts of the wider calls, in bytes and characters.
 TEST_F(Lobs, NullPlacesAndWideAmounts) {
     ub4 length = 1;
     boolean flag = TRUE;
@@ -191,15 +191,16 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     EXPECT_EQ(Write(lob, kPast, "x"), 22925);
     EXPECT_EQ(Read(lob, kPast), "11:h\xC3\xA4llo world");
     oraub8 bytes = 1;
-    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &bytes, ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)), 24281);
+    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &bytes, ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)),
+              24281);
     const struct { bool of_bytes; oraub8 bytes, characters, told_bytes, told_characters; } reads[] = {
         {false, 3, 0, 3, 2}, {false, 0, 9, 6, 5}, {true, 9, 1, 3, 3}};
     for (const auto& c : reads) {
         char area[6];
         bytes = c.bytes;
         oraub8 characters = c.characters;
-        EXPECT_EQ(Answer(OCILobRead2(svc, err, c.of_bytes ? other : lob, &bytes, &characters, 1, area, 6, OCI_ONE_PIECE, nullptr,
-                                     nullptr, 0, 0)), 0);
+        EXPECT_EQ(Answer(OCILobRead2(svc, err, c.of_bytes ? other : lob, &bytes, &characters, 1, area, 6, OCI_ONE_PIECE,
+                                     nullptr, nullptr, 0, 0)), 0);
         EXPECT_EQ(bytes, c.told_bytes) << c.bytes;
         EXPECT_EQ(characters, c.told_characters) << c.bytes;
     }

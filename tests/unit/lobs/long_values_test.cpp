@@ -67,7 +67,8 @@ protected:
         return FetchCode();
     }
     void BindInPieces(OCIBind** bind, const char* sql, ub2 type) {
-        MUST(Prepare(sql), BindName(bind, ":v", {nullptr, 0x7FFFFFFF, type, nullptr, nullptr, nullptr, OCI_DATA_AT_EXEC}));
+        const Area in_pieces{nullptr, 0x7FFFFFFF, type, nullptr, nullptr, nullptr, OCI_DATA_AT_EXEC};
+        MUST(Prepare(sql), BindName(bind, ":v", in_pieces));
     }
     // Fetches one value in pieces; the length of it, or where it is another than was put in.
     std::uint64_t TakePieces(std::string_view sql, ub2 type) {

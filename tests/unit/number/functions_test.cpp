@@ -14,7 +14,9 @@ constexpr mpfr_prec_t kReferenceBits = 2000;
 class Reference {
 public:
     Reference() { mpfr_init2(value_, kReferenceBits); }
-    explicit Reference(const OCINumber& value) : Reference() { mpfr_set_q(value_, Exact(value).get_mpq_t(), MPFR_RNDN); }
+    explicit Reference(const OCINumber& value) : Reference() {
+        mpfr_set_q(value_, Exact(value).get_mpq_t(), MPFR_RNDN);
+    }
     ~Reference() { mpfr_clear(value_); }
     Reference(const Reference&) = delete;
     Reference& operator=(const Reference&) = delete;

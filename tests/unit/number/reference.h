@@ -72,7 +72,7 @@ inline number::Errno Rounded(mpq_class value, OCINumber* result) {
     mpz_class whole = (value.get_num() * 2 + value.get_den()) / value.get_den() / 2;    // floor(value + 1/2)
     if (whole >= Hundreds(20)) whole /= 100, ++exponent;
     int digits[20], count = 20;
-    for (int i = 19; i >= 0; --i) digits[i] = static_cast<int>(mpz_fdiv_q_ui(whole.get_mpz_t(), whole.get_mpz_t(), 100));
+    for (int i = 19; i >= 0; --i, whole /= 100) digits[i] = static_cast<int>(mpz_class(whole % 100).get_si());
     while (digits[count - 1] == 0) --count;
     *result = Composed(digits, count, exponent, sign < 0);
     return exponent > 62 ? 22053 : exponent < -65 ? 22054 : 0;

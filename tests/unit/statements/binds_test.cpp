@@ -41,7 +41,7 @@ TEST_F(Binds, WhatIsBound) {
 class Cache : public StatementTest {
 protected:
     void Prepare2(std::string_view text) {
-        ASSERT_EQ(OCIStmtPrepare2(svc, &stmt, err, Bytes(text), Size(text), nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT), 0);
+        MUST(OCIStmtPrepare2(svc, &stmt, err, Bytes(text), Size(text), nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT));
     }
     void Release() { ASSERT_EQ(OCIStmtRelease(stmt, err, nullptr, 0, OCI_DEFAULT), OCI_SUCCESS); }
 };

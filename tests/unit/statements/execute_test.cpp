@@ -33,10 +33,11 @@ TEST_F(Executing, RowsReturnedByTheLastExecution) {
         MustRun("delete from t where a > 3");
         std::array<sb4, 3> in = c.in, back = {};
         OCIBind* bind = nullptr;
-        MUST(Prepare("insert into t values(:a) returning a into :b"), BindName("a", Int(in)), BindName(&bind, "b", Int(back)));
+        MUST(Prepare("insert into t values(:a) returning a into :b"));
+        MUST(BindName("a", Int(in)), BindName(&bind, "b", Int(back)));
         for (const bool again : {false, true}) {    // when all of them are there
             EXPECT_EQ(Execute(3, c.mode), again && c.mode == OCI_DEFAULT ? 1 : c.answer);
-            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), again ? 0 : c.returned) << in[1] << in[2];
+            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), again ? 0 : c.returned) << in[1];
         }
     }
 }
@@ -69,7 +70,8 @@ TEST_F(Executing, TablesAtTheirLimits) {
         {4, 0, {1, 2, 3, -1}, 3}, {3, 0, {1, 2, 3, -1}, 3}, {2, 1414, {1, 2, -1, -1}, 2}};
     for (const auto& c : out) {
         std::array<sb4, 4> got = {-1, -1, -1, -1};
-        MUST(Prepare("begin select a into :1 from t order by a; end;"), Bind(1, Int(got), OCI_DEFAULT, c.most, &(current = 0)));
+        ASSERT_EQ(Prepare("begin select a into :1 from t order by a; end;"), 0);
+        ASSERT_EQ(Bind(1, Int(got), OCI_DEFAULT, c.most, &(current = 0)), 0);
         EXPECT_EQ(Execute(), c.answer) << c.most;
         EXPECT_EQ(current, c.current) << c.most;
         EXPECT_EQ(got, c.got) << c.most;

@@ -12,7 +12,8 @@ protected:
     sb4 Get(Wanted& wanted) const {
         ub1 direction = 0, piece = 0;
         ub4 iteration = 0, index = 0;
-        return Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &direction, &iteration, &index, &piece));
+        return Answer(OCIStmtGetPieceInfo(stmt, err, &wanted.handle, &wanted.type, &direction, &iteration, &index,
+                                          &piece));
     }
     // Gives the place of the next piece.
     sb4 Set(const void* buffer, ub4* length, ub1 piece, sb2* indicator = nullptr, ub2* code = nullptr) const {

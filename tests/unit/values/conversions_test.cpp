@@ -111,7 +111,7 @@ TEST_F(Conversions, ObjectsOfAnotherKind) {
         {SQLT_TIMESTAMP, "select timestamp '2024-02-29 13:05:07.5' from dual", "!21710"}};
     for (const auto& c : cases) {
         EXPECT_EQ(In(Raw<void*>(nullptr), c.type), c.null) << c.type;
-        for (void* wrong : {static_cast<void*>(raw), static_cast<void*>(stmt), static_cast<void*>(datetime), static_cast<void*>(area_)}) {
+        for (void* wrong : std::initializer_list<void*>{raw, stmt, datetime, area_}) {
             EXPECT_EQ(In(Raw(wrong), c.type), "!21710") << c.type;
             EXPECT_EQ(Query(c.query, {{&wrong, 8, c.type}}), 21710) << c.type;
         }
