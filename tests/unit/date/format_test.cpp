@@ -5,7 +5,6 @@
 
 #include "date/format.h"
 #include "date/zone.h"
-#include "reading.h"
 
 namespace {
 

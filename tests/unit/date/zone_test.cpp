@@ -9,11 +9,16 @@
 
 #include "date/zone.h"
 #include "date/zone_rules.h"
-#include "reading.h"
 
 namespace {
 
 using namespace date;
+
+DateTime Read(std::string_view text) {
+    DateTime value;
+    EXPECT_EQ(FromEngineText(text, &value), 0) << text;
+    return value;
+}
 
 TEST(Zone, RegionsNameTheirSeasons) {
     const struct { const char* value; const char* region; const char* name; } cases[] = {

@@ -134,30 +134,6 @@ TEST_F(Dynamic, ValuesGoInByIteration) {
     }
 }
 
-// The rows of each iteration are counted before they come out, row by row; a plain bind beside keeps the last.
-TEST_F(Dynamic, ReturningFeedsRowsByIteration) {
-    MustRun("create table t(id number, a varchar2(40))", "insert into t values(1, 'one'), (1, 'uno'), (2, 'two'), (3, null)");
-    sb4 ids[3] = {1, 7, 3}, last[3] = {};
-    for (const bool asks_in : {false, true}) {
-        Taker taker(2);
-        string counts;
-        const auto take = taker.act;
-        taker.act = [&](Callback::Place& out) {
-            counts += std::to_string(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, binds_[2], OCI_HTYPE_BIND));
-            return take(out);
-        };
-        Giver nulls({"0", "0", "0"});
-        MUST(Prepare("update t set a = a where id = :1 returning a, id into :2, :3"), Bind(1, Int(ids)));
-        MUST(BindTo(2, asks_in ? &nulls : nullptr, &taker), Bind(3, Int(last)), Execute(3));
-        EXPECT_EQ(taker.asked, "0.0.0 0.0.2 0.1.0 0.1.2 2.0.0 ");
-        EXPECT_EQ(counts, "22221");
-        EXPECT_EQ(taker.Flush(), "one|uno|-|");
-        EXPECT_EQ(nulls.asked, asks_in ? "0.0.0 1.0.0 2.0.0 " : "");
-        EXPECT_EQ(RowCount(), 3u);
-        EXPECT_EQ(last[2], 3);
-    }
-}
-
 // Variables of a block: what goes in is read, what was assigned comes out; elements of tables each in their turn.
 TEST_F(Dynamic, BlocksAndTables) {
     MustRun("create table t(a varchar2(40))");
