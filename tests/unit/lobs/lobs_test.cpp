@@ -211,17 +211,23 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     EXPECT_EQ(two, 2u) << "in characters";
 }
 
-// A read in pieces holds the session's other large objects up, until its locator is gone.
-TEST_F(Lobs, AReadThatIsNotFinished) {
-    ub4 length = 0;
+// What goes in pieces holds the session's other calls up, until it is finished or its locator is gone.
+TEST_F(Lobs, PiecesThatAreNotFinished) {
+    ub4 length = 0, amount = 3;
     Fetch(lob);
     Temporary(other);
+    EXPECT_EQ(Write(other, 1, "ab\xC3", OCI_FIRST_PIECE, &amount), OCI_NEED_DATA);
+    EXPECT_EQ(Answer(OCI_ERROR), 3129);
+    EXPECT_EQ(Read(other), "!24804");
+    EXPECT_EQ(Write(lob, 1, "x"), 24804);
+    EXPECT_EQ(Write(other, 99, "\xA4", OCI_LAST_PIECE, &amount), 0) << "the offset is not looked at";
     EXPECT_EQ(Read(lob, 11, 1, 4), "more 4:h\xC3\xA4l");
     EXPECT_EQ(Answer(OCI_ERROR), 3130);
     EXPECT_EQ(Read(other), "!24804");
+    EXPECT_EQ(Write(lob, 1, "x"), 24804);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
     EXPECT_EQ(OCIDescriptorFree(lob, OCI_DTYPE_LOB), OCI_SUCCESS);
-    EXPECT_EQ(Read(other), "!100") << "the end of nothing";
+    EXPECT_EQ(Read(other), "3:ab\xC3\xA4");
 }
 
 TEST_F(Lobs, FormsOfEachKind) {

@@ -43,13 +43,13 @@ protected:
     void Prepare2(std::string_view text) {
         MUST(OCIStmtPrepare2(svc, &stmt, err, Bytes(text), Size(text), nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT));
     }
+    void Keep(ub4 size) { MUST(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, err)); }
     void Release() { ASSERT_EQ(OCIStmtRelease(stmt, err, nullptr, 0, OCI_DEFAULT), OCI_SUCCESS); }
 };
 
 // What a statement has bound is there as long as the cache keeps it, and goes with it.
 TEST_F(Cache, KeepsBinds) {
-    ub4 size = 1;
-    ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, err)), 0);
+    Keep(2);
     sb4 in = 7, out = 0;
     ub2 set = 0;
     OCIBind* bind = nullptr;
@@ -62,10 +62,13 @@ TEST_F(Cache, KeepsBinds) {
     ASSERT_EQ(Execute(1), 0);
     EXPECT_EQ(out, 8);
     Release();
-    EXPECT_EQ(OCIAttrGet(bind, OCI_HTYPE_BIND, &set, nullptr, OCI_ATTR_CHARSET_ID, err), OCI_SUCCESS);
     Prepare2("select 3 from dual");
-    Release();    // the logoff that follows finds it kept
+    Release();
+    EXPECT_EQ(OCIAttrGet(bind, OCI_HTYPE_BIND, &set, nullptr, OCI_ATTR_CHARSET_ID, err), OCI_SUCCESS);
+    Keep(1);
+    Prepare2("select :a from dual");    // the older one went
     EXPECT_EQ(OCIAttrGet(bind, OCI_HTYPE_BIND, &set, nullptr, OCI_ATTR_CHARSET_ID, err), OCI_INVALID_HANDLE);
+    Release();    // the logoff that follows finds it kept
 }
 
 // ---- Calls as no application should make them
