@@ -9,7 +9,6 @@
 #include <cstdlib>
 #include <filesystem>
 #include <memory>
-#include <sstream>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -93,14 +92,6 @@ inline std::string Shown(const Datum& value) {
         case Kind::text: return std::string(value.Text());
         default: return "kind " + std::to_string(static_cast<int>(value.kind)) + " " + std::string(value.Text());
     }
-}
-
-// All that is told of a column.
-inline std::string Told(const engine::Column& column) {
-    std::ostringstream told;
-    told << column.name << " type " << column.type << " size " << column.size << " precision " << int{column.precision}
-         << " scale " << int{column.scale} << (column.nullable ? "" : " not null");
-    return told.str();
 }
 
 // Rows held as they are; one may be refused.

@@ -59,27 +59,6 @@ TEST_F(Sqlite, BoundMomentsAreWrittenAsTheirColumnsAre) {
     EXPECT_EQ(Query("select v from t where d is null"), "12:30:00;") << "a time alone";
 }
 
-// 48 MB: more than stays in memory.
-TEST_F(Sqlite, OpenQueryOutlivesItsTablesInATemporaryFile) {
-    ASSERT_EQ(Run("create table t(n integer, v varchar2(2000))"), 0);
-    ASSERT_EQ(Run("with recursive r(n) as (select 1 union all select n + 1 from r where n < 40000) "
-                  "insert into t select n, hex(zeroblob(600)) from r"), 0);
-    struct : engine::RowSink {
-        std::int64_t row = 0;
-        Status Row(std::uint32_t, std::span<const Datum> values) override {
-            const bool is_right = values[0].integer == ++row && values[1].length == 1200 &&
-                                  values[1].Text().find_first_not_of('0') == std::string_view::npos;
-            return is_right ? Status() : Error(600);
-        }
-    } sink;
-    const auto open = Opened("select n, v from t order by n");
-    bool more = false;
-    MUST(Answer(open->Fetch(sink, 1, more)), Run("drop table t"));
-    ASSERT_EQ(Answer(open->Fetch(sink, 100000, more)), 0) << "row " << sink.row;
-    EXPECT_EQ(sink.row, 40000);
-    EXPECT_FALSE(more);
-}
-
 // Transcripts show what else is refused of their table.
 TEST_F(Sqlite, AccountsAreNobodysBusiness) {
     EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "other")), 1017) << "no accounts";
