@@ -123,8 +123,7 @@ struct Written : engine::RowSink {
 
 inline Effect EffectOf(std::string_view sql) {
     const auto begins = [&](std::string_view word) { return sql.size() > word.size() && strncasecmp(sql.data(), word.data(), word.size()) == 0; };
-    const bool is_change_behind_with = begins("with") && sql.find("insert into") != std::string_view::npos;
-    if (is_change_behind_with || begins("insert") || begins("update") || begins("delete")) return Effect::changes;
+    if (begins("insert") || begins("update") || begins("delete")) return Effect::changes;
     if (begins("create") || begins("drop") || begins("alter")) return Effect::defines;
     if (begins("select") || begins("with") || begins("values") || begins("pragma")) return Effect::reads;
     return Effect::controls;
@@ -161,15 +160,12 @@ protected:
         std::unique_ptr<engine::Connection> connection;
         return Answer(database_->Connect({user, password, false}, stop_, connection));
     }
-    // Placeholders are written %1, %2; a row's own column is the dialect's.
+    // Placeholders are written %1, %2.
     std::string Spelled(std::string_view sql) const {
         std::string text;
-        const std::string_view row_id = database_->GetDialect().row_id;
         for (std::size_t at = 0; at < sql.size(); ++at) {
             const bool is_placeholder = sql[at] == '%' && at + 1 < sql.size() && sql[at + 1] >= '1' && sql[at + 1] <= '9';
-            const bool is_row_id = !row_id.empty() && sql.substr(at).starts_with("rowid");
-            if (is_row_id) text += row_id, at += 4;
-            else if (is_placeholder) text += database_->GetDialect().placeholder(static_cast<std::size_t>(sql[++at] - '0'));
+            if (is_placeholder) text += database_->GetDialect().placeholder(static_cast<std::size_t>(sql[++at] - '0'));
             else text += sql[at];
         }
         return text;

@@ -43,8 +43,8 @@ TEST(SqlText, HostileTextsTakeBoundedTime) {
         return text;
     };
     const auto start = std::chrono::steady_clock::now();
-    for (const char* piece : {"(", "cast(", "decode(", "from (select ", "'", "\"", "/*", "--\n", ":a ", "?", "rowid in (", "with ", ";", "for update ",
-                              "q'", "q'[", "e+", "begin ", "into :x,", "rowid = "}) {
+    for (const char* piece : {"(", "cast(", "decode(", "from (select ", "'", "\"", "/*", "--\n", ":a ", "?", "rowid in (",
+                              "with ", ";", "for update ", "q'", "q'[", "e+", "begin ", "into :x,", "rowid = "}) {
         const std::string text = repeat(piece);
         const sql::StatementText statement = sql::Scan(text);
         for (const sql::Step& step : statement.steps) sql::Rewrite(text, statement, step, TestDialect());

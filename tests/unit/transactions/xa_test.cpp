@@ -121,7 +121,8 @@ TEST_F(XaCalls, ThreadsOfControl) {
     EXPECT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK);
     other.join();
     EXPECT_EQ(Call(kPrepare, xid, TMNOFLAGS, 5), XAER_PROTO) << "the other thread's";
-    SHOULD(Call(kStart, xid, TMRESUME), Call(kEnd, xid, TMSUCCESS), Call(kPrepare, xid, TMNOFLAGS), Call(kCommit, xid, TMNOFLAGS),
+    SHOULD(Call(kStart, xid, TMRESUME), Call(kEnd, xid, TMSUCCESS), Call(kPrepare, xid, TMNOFLAGS),
+           Call(kCommit, xid, TMNOFLAGS),
            Run("one", "insert into t select 1 / (case count(*) when 1 then 1 else 0 end) from t"),
            OCITransCommit(xaoSvcCtx(Text("one")), err_, OCI_DEFAULT));
 }
@@ -135,7 +136,8 @@ TEST_F(XaCalls, WhatRestsTooLongIsRolledBack) {
              Call(kStart, Named(name, "x"), TMNOFLAGS, rmid), Run(name.c_str(), "insert into t values(1)"),
              Call(kEnd, Named(name, "x"), TMSUCCESS, rmid));
     }
-    MUST(Call(kPrepare, Named("4", "x"), TMNOFLAGS, 4), Call(kStart, Named("5", "x"), TMJOIN, 5), Open(3, "SqlNet=one+SesTm=1"));
+    MUST(Call(kPrepare, Named("4", "x"), TMNOFLAGS, 4), Call(kStart, Named("5", "x"), TMJOIN, 5),
+         Open(3, "SqlNet=one+SesTm=1"));
     const XID xid = Named("time", "x");
     MUST(Call(kStart, xid, TMNOFLAGS, 3), Run(nullptr, "insert into t values(1)"));
     auto* named = New<OCITrans>(OCI_HTYPE_TRANS);
