@@ -32,6 +32,7 @@ public:
           names_columns_(statement.type == StatementType::create || statement.type == StatementType::alter),
           defines_code_(DefinesCode(tokens_)) {
         if (!dialect.casts.empty()) FindCasts();
+        if (dialect.decode) CountArguments();
         result_.source_begin = copied_ = step.begin;
         if (step.run != Run::assign) return;
         result_.sql = "select ";    // an expression by itself
@@ -192,16 +193,23 @@ private:
     }
 
     // How many arguments the parentheses at `index` hold, if they are a decode's.
-    std::size_t Arguments(std::size_t index) const {
-        if (!dialect_.decode || !Previous(index).Is("decode")) return 0;
-        std::size_t count = 1;
-        int depth = 0;
-        for (std::size_t at = index; tokens_[at].kind != TokenKind::end; ++at) {
-            if (tokens_[at].Is("(")) ++depth;
-            if (tokens_[at].Is(")") && --depth == 0) break;
-            count += depth == 1 && tokens_[at].Is(",");
+    std::size_t Arguments(std::size_t index) const { return arguments_.empty() ? 0 : arguments_[index]; }
+
+    // Counts the arguments of all decodes in one pass.
+    void CountArguments() {
+        arguments_.resize(tokens_.size());
+        std::vector<std::size_t> open;
+        for (std::size_t index = 0; tokens_[index].kind != TokenKind::end; ++index) {
+            const Token& token = tokens_[index];
+            if (token.Is("(")) {
+                arguments_[index] = Previous(index).Is("decode") ? 1 : 0;
+                open.push_back(index);
+            } else if (token.Is(")")) {
+                if (!open.empty()) open.pop_back();
+            } else if (token.Is(",") && !open.empty() && arguments_[open.back()] > 0) {
+                ++arguments_[open.back()];
+            }
         }
-        return count;
     }
 
     // What stands between the arguments of a decode.
@@ -468,6 +476,7 @@ private:
     const bool names_columns_;
     const bool defines_code_;
     std::vector<Open> open_;
+    std::vector<std::size_t> arguments_;    // by token: of the decode that opens there
     std::vector<std::size_t> cast_as_;    // by token; 0: no cast that becomes a function
     std::size_t type_end_ = std::string_view::npos;
     bool in_from_ = false;
