@@ -81,6 +81,64 @@ TEST_F(Executing, TablesAtTheirLimits) {
     }
 }
 
+// Of several columns, an error in one tells more than a truncation in another, whichever comes first.
+TEST_F(Executing, TheGravestOfARow) {
+    for (const bool cut_first : {true, false}) {
+        char text[3] = "";
+        ub2 code = 0;
+        sb1 small = 0;
+        ASSERT_EQ(Prepare(cut_first ? "select 'abcdef', 1000 from dual" : "select 1000, 'abcdef' from dual"), 0);
+        ASSERT_EQ(Define(cut_first ? 1 : 2, Text(text, nullptr, nullptr, &code)), 0);
+        ASSERT_EQ(Define(cut_first ? 2 : 1, Int(small)), 0);
+        EXPECT_EQ(Execute(1), 1455) << cut_first;
+        EXPECT_EQ(code, 1406) << "the other column is stored all the same";
+    }
+}
+
+// What was compiled and opened on one session is left behind when the statement is executed on another.
+TEST_F(Executing, ThroughAnotherSession) {
+    OCISvcCtx* services[2] = {svc, nullptr};
+    ASSERT_EQ(Logon(&services[1]), OCI_SUCCESS);
+    for (const sb4 number : {1, 2}) {
+        svc = services[number - 1];
+        MustRun("create temporary table t(a number)", "insert into t values(" + std::to_string(number) + ")");
+    }
+    sb4 value = 0;
+    ASSERT_EQ(Query("select a from t", {Int(value)}, 0), 0);
+    for (const sb4 number : {2, 1, 2}) {
+        svc = services[number - 1];
+        MUST(Execute(0), Fetch());
+        EXPECT_EQ(value, number);
+        for (OCISvcCtx* service : services) {
+            const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, service, OCI_HTYPE_SVCCTX);
+            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), service == svc ? 1u : 0u);
+        }
+    }
+    EXPECT_EQ(OCILogoff(services[0], err), OCI_SUCCESS);
+}
+
+TEST_F(Executing, LogoffEndsWhatIsOpen) {
+    sb4 value = 0;
+    MUST(Query("select 1 from dual", {Int(value)}, 0), OCILogoff(svc, err));
+    EXPECT_EQ(Fetch(), 3114);
+    EXPECT_EQ(Execute(0), 3114);
+    ASSERT_EQ(Prepare("select 2 from dual"), 0);
+    EXPECT_EQ(Fetch(), 24338) << "a new text was never executed";
+}
+
+// Between fetches a column may be defined anew, as another type, and its define be freed: the other stays defined.
+TEST_F(Executing, DefinesMayBeMadeAnewAndFreed) {
+    sb4 id = 0, name = 0;
+    sb8 wide = 0;
+    OCIDefine* define = nullptr;
+    const char* const rows = "select 1, 10 from dual union all select 2, 20 from dual union all select 3, 30 from dual";
+    MUST(Query(rows, {Int(id), Int(name)}));
+    MUST(Define(&define, 1, Int(wide)), Fetch());
+    EXPECT_EQ(wide, 2);
+    MUST(OCIHandleFree(define, OCI_HTYPE_DEFINE), Fetch());
+    EXPECT_EQ(wide + id + name, 2 + 1 + 30);
+}
+
 // What the server says besides comes with a success, in its order; behind a truncation, which is told first.
 TEST_F(Executing, NoticesAreInformation) {
     if (!OnServer()) return;

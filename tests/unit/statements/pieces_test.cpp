@@ -87,6 +87,56 @@ TEST_F(PieceByPiece, WhatIsToldOfAValueThatIsCut) {
     }
 }
 
+// A scrollable query, from a position on; one that delivers fewer rows than are asked for stays on the last.
+TEST_F(PieceByPiece, RowsFromAPosition) {
+    sb4 ids[2] = {};
+    ASSERT_EQ(Query("select 'a', 1 from dual union all select 'b', 2 from dual union all select 'c', 3 from dual",
+                    {InPieces(SQLT_CHR), Int(ids)}, 0, OCI_STMT_SCROLLABLE_READONLY), 0);
+    EXPECT_EQ(OCIStmtFetch2(stmt, err, 2, OCI_FETCH_ABSOLUTE, 3, OCI_DEFAULT), OCI_NEED_DATA);
+    sword rc = 0;
+    EXPECT_EQ(Piece(3, rc), "c");
+    EXPECT_EQ(rc, OCI_NO_DATA);
+    EXPECT_EQ(Attribute<ub4>(OCI_ATTR_CURRENT_POSITION), 3u);
+    EXPECT_EQ(OCIStmtFetch2(stmt, err, 1, OCI_FETCH_FIRST, 0, OCI_DEFAULT), OCI_NEED_DATA);
+    EXPECT_EQ(ids[0] * 10 + ids[1], 10) << "no row more";
+}
+
+TEST_F(PieceByPiece, AQueryTakesItsValuesInPieces) {
+    char got[9] = "";
+    ASSERT_EQ(Ready("select :1 || 'c' from dual union all select 'd' from dual", {InPieces(SQLT_CHR)}) + Define(1, Text(got)), 0);
+    for (const ub4 mode : {OCI_EXACT_FETCH, OCI_DEFAULT}) {
+        ASSERT_EQ(ExecuteCode(1, mode), OCI_NEED_DATA);
+        for (const ub1 piece : {OCI_FIRST_PIECE, OCI_LAST_PIECE}) {
+            ub4 length = 1;
+            ASSERT_EQ(Set(piece == OCI_FIRST_PIECE ? "a" : "b", &length, piece), 0);
+            EXPECT_EQ(Execute(1, mode), piece == OCI_FIRST_PIECE ? 3129 : mode == OCI_DEFAULT ? 0 : 1422);
+        }
+        EXPECT_STREQ(got, "abc");
+    }
+    EXPECT_EQ(Fetch(), 0);
+    EXPECT_STREQ(got, "d");
+}
+
+// The null of one row is not that of the next; text of a terminated type ends at its zero, other text does not.
+TEST_F(PieceByPiece, ValuesGoInAsTheyAre) {
+    MustRun("create table t(a varchar2(10), b raw(10))");
+    ASSERT_EQ(Ready("insert into t values(:1, :2)", {InPieces(SQLT_STR), InPieces(SQLT_BIN)}), 0);
+    sword rc = ExecuteCode(2);
+    for (const sb2 given : {-1, 0}) {
+        for (int column = 0; column < 2; ++column) {
+            ASSERT_EQ(rc, OCI_NEED_DATA);
+            sb2 indicator = given;
+            ub4 length = 4;
+            ASSERT_EQ(Set("ab\0c", &length, OCI_ONE_PIECE, &indicator), 0);
+            rc = ExecuteCode(2);
+        }
+    }
+    ASSERT_EQ(rc, OCI_SUCCESS);
+    EXPECT_EQ(RowCount(), 2u);
+    EXPECT_EQ(One("select group_concat(coalesce(a, '-') || ':' || hex(b), '/') from t"),
+              "-:/ab:61620063");
+}
+
 // What takes part in a waiting operation is freed: the operation is given up.
 TEST_F(PieceByPiece, HandlesThatAreFreedMeanwhile) {
     ASSERT_EQ(Prepare("select 'abc' from dual"), 0);
