@@ -82,45 +82,29 @@ TEST_F(ThreadCalls, AThreadThatCannotStart) {
     EXPECT_EQ(Answer(OCIThreadClose(env_, err_, handle)), 21560) << "no thread yet";
 }
 
+// In threads of the application's own, too: each ends with a value of its own, without one, or without the key.
 TEST_F(ThreadCalls, KeysHoldAValueForEachThread) {
     OCIThreadKey* key = NewKey(CountDestroyed);
     OCIThreadKey* plain = NewKey();
-    dvoid* value = &key;
-    EXPECT_EQ(Answer(OCIThreadKeyGet(env_, err_, key, &value)), 0);
-    EXPECT_EQ(value, nullptr);
     ASSERT_EQ(Answer(OCIThreadKeySet(env_, err_, key, this)), 0);
-    Work work{env_, err_, key};
-    const auto routine = [](dvoid* given) {
-        auto* mine = static_cast<Work*>(given);
-        dvoid* seen = mine;
-        mine->failures += OCIThreadKeyGet(mine->env, mine->err, mine->key, &seen) != OCI_SUCCESS || seen != nullptr;
-        mine->failures += OCIThreadKeySet(mine->env, mine->err, mine->key, mine) != OCI_SUCCESS;
-        mine->failures += OCIThreadKeyGet(mine->env, mine->err, mine->key, &seen) != OCI_SUCCESS || seen != mine;
+    const auto in_a_thread = [&](OCIThreadKey* of, auto end) {
+        std::thread([&] {
+            dvoid *before = this, *after = nullptr;
+            EXPECT_EQ(OCIThreadKeyGet(env_, err_, of, &before), OCI_SUCCESS);
+            EXPECT_EQ(before, nullptr);
+            SHOULD(OCIThreadKeySet(env_, err_, of, &after), OCIThreadKeyGet(env_, err_, of, &after));
+            EXPECT_EQ(after, &after);
+            end();
+        }).join();
+        return destroyed.load();
     };
-    OCIThreadHandle* handle = NewHandle();
-    ASSERT_EQ(Answer(OCIThreadCreate(env_, err_, routine, &work, nullptr, handle)), 0);
-    ASSERT_EQ(Answer(OCIThreadJoin(env_, err_, handle)), 0);
-    EXPECT_EQ(work.failures, 0);
-    EXPECT_EQ(destroyed, 1) << "before the join is done";
+    EXPECT_EQ(in_a_thread(key, [] {}), 1);
+    EXPECT_EQ(in_a_thread(plain, [] {}), 1);
+    EXPECT_EQ(in_a_thread(key, [&] { OCIThreadKeySet(env_, err_, key, nullptr); }), 1);
+    dvoid* value = nullptr;
     EXPECT_EQ(Answer(OCIThreadKeyGet(env_, err_, key, &value)), 0);
     EXPECT_EQ(value, this);
-    // Threads of the application's own get the same; no value, no call; none after the key is gone.
-    std::thread([&] { routine(&work); }).join();
-    EXPECT_EQ(destroyed, 2);
-    work.key = plain;
-    std::thread([&] { routine(&work); }).join();
-    EXPECT_EQ(destroyed, 2);
-    work.key = key;
-    std::thread([&] {
-        routine(&work);
-        OCIThreadKeySet(env_, err_, key, nullptr);
-    }).join();
-    EXPECT_EQ(destroyed, 2);
-    std::thread([&] {
-        routine(&work);
-        EXPECT_EQ(OCIThreadKeyDestroy(env_, err_, &key), OCI_SUCCESS);
-    }).join();
-    EXPECT_EQ(destroyed, 2);
+    EXPECT_EQ(in_a_thread(key, [&] { EXPECT_EQ(OCIThreadKeyDestroy(env_, err_, &key), OCI_SUCCESS); }), 1);
     EXPECT_EQ(key, nullptr);
 }
 
