@@ -67,12 +67,6 @@ TEST(ErrorTexts, States) {
     EXPECT_EQ(SqlState(-1), "HY000");
 }
 
-TEST(ErrorTexts, Message) {
-    EXPECT_EQ(ErrorMessage(942, "SQLITE", "no such table: t\n"),
-              "[KELP/SQLITE] ORA-00942: table or view does not exist: no such table: t\n");
-    EXPECT_EQ(ErrorMessage(24374, "CLIENT", ""), "[KELP/CLIENT] ORA-24374: define missing before fetch\n");
-}
-
 TEST(ErrorLists, KeepWhatIsAdded) {
     ErrorList list, other;
     list.Add(Error(1));
@@ -115,28 +109,21 @@ TEST(CharacterSets, NoPairIsTornAndWhatIsMalformedIsReplaced) {
     }
 }
 
+// Nothing is written behind the room, and what is written is whole characters.
 TEST(TextToBuffer, CutsBetweenCharacters) {
-    for (const bool utf16 : {false, true}) {
-        const std::uint32_t mode = utf16 ? OCI_UTF16 : OCI_DEFAULT;
+    const std::string_view text = "\xC3\xA4\xF0\x9F\x98\x80z";    // 2, 4 and 1 bytes; 1, 2 and 1 units
+    const struct { std::uint32_t mode; std::vector<std::size_t> lengths; } cases[] = {
+        {OCI_DEFAULT, {0, 0, 2, 2, 2, 2, 6, 7}}, {OCI_UTF16, {0, 0, 2, 2, 2, 2, 6, 6, 8}}};    // with room for so many and the zero
+    for (const auto& [mode, lengths] : cases) {
         Environment* environment = Environment::Open(mode, Environment::SetsOf(mode), {}, 0);
-        const std::string text = "\xC3\xA4\xF0\x9F\x98\x80z";    // 2, 4 and 1 bytes; 1, 2 and 1 units
-        std::string whole;
-        const std::string_view out = TextOut(*environment, text, whole);
-        const std::size_t zero = utf16 ? 2 : 1;
-        std::size_t last = 0;
-        for (std::size_t size = 0; size <= out.size() + zero; ++size) {
-            std::string buffer(32, 'x');
-            EXPECT_EQ(TextToBuffer(*environment, text, buffer.data(), size), size == out.size() + zero) << size;
-            EXPECT_EQ(buffer[size], 'x') << size;
-            if (size < zero) continue;
-            const std::size_t length = TextLength(*environment, buffer.data());
-            EXPECT_EQ(buffer.substr(0, length), out.substr(0, length));
-            EXPECT_GE(length, last);
-            std::string check;
-            EXPECT_TRUE(utf16 ? utf::ToUtf8(buffer.data(), length, check)
-                              : utf::ToUtf16(buffer.substr(0, length), check))
-                << size;
-            last = length;
+        std::string kept;
+        const std::string_view whole = TextOut(*environment, text, kept);
+        const std::size_t zero = mode == OCI_UTF16 ? 2 : 1;
+        for (std::size_t room = 0; room < lengths.size() + zero; ++room) {
+            std::string expected(32, 'x'), buffer = expected;
+            if (room >= zero) expected.replace(0, lengths[room - zero] + zero, std::string(whole.substr(0, lengths[room - zero])) + std::string(zero, '\0'));
+            EXPECT_EQ(TextToBuffer(*environment, text, buffer.data(), room), room == whole.size() + zero) << room;
+            EXPECT_EQ(buffer, expected) << room;
         }
         Destroy(environment);
     }

@@ -1,6 +1,7 @@
 // Character sets of environments, binds and defines, and the calls on sets and settings. The bytes of the texts are
 // another program's.
 #include "support/call_fixture.h"
+#include "support/statement_fixture.h"
 
 namespace {
 
@@ -13,41 +14,34 @@ struct NlsCalls : CallFixture {
     }
 };
 
+// From a set to another, into so much room: the text, or the number of what it is refused with and how far it came.
 TEST_F(NlsCalls, TextsAreConverted) {
+    const auto convert = [&](ub2 to, ub2 from, std::string_view text, size_t room = 20) {
+        char area[20] = "";
+        size_t length = 0;
+        const sb4 answer = Answer(OCINlsCharSetConvert(env_, err_, to, area, room, from, text.data(), text.size(), &length));
+        return std::pair(answer, std::string(area, length));
+    };
     const struct { ub2 set; std::string_view text, utf8; } cases[] = {
         {178, "Z\xfcr\x80", "Zür€"}, {171, "\xc4\xe0", "Да"}, {46, "\xa4\xe9", "€é"}, {170, "\xa3\x9f", "Łź"},
         {31, "\x80\xe9", "\u0080é"}, {1, "az~", "az~"}, {2000, {"\0\xe9\xd8=\xde\0", 6}, "é😀"}, {871, "é", "é"}};
     for (const ub2 own : {873, 1000}) {    // the environment's has no say
         Nls(own);
         for (const auto& c : cases) {
-            char area[20] = "";
-            size_t length = 0;
-            EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 873, area, sizeof area, c.set, c.text.data(), c.text.size(),
-                                                  &length)), 0);
-            EXPECT_EQ(std::string_view(area, length), c.utf8) << c.set;
-            EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, c.set, area, sizeof area, 873, c.utf8.data(), c.utf8.size(),
-                                                  &length)), 0);
-            EXPECT_EQ(std::string_view(area, length), c.text) << c.set;
+            EXPECT_EQ(convert(873, c.set, c.text), std::pair(0, std::string(c.utf8))) << c.set;
+            EXPECT_EQ(convert(c.set, 873, c.utf8), std::pair(0, std::string(c.text))) << c.set;
         }
     }
     Nls(873);
-    const struct { ub2 to, from; std::string_view text; size_t room; sb4 answer; std::string_view result; } edges[] = {
+    const struct { ub2 to, from; std::string_view text; size_t room; sb4 answer; std::string result; } edges[] = {
         {31, 873, "€😁é", 9, 0, "??\xe9"}, {1, 873, "é", 9, 0, "?"}, {873, 1, "\x80", 9, 24501, ""},
         {873, 178, "\x81", 9, 24501, ""}, {31, 873, "\xc3", 9, 24501, ""}, {873, 31, "a\xe9", 2, 22059, "a"},
         {2000, 873, "\U0010FFFF", 3, 22059, ""}, {7, 873, "a", 9, 24329, ""}, {873, 873, "ab", 0, 22059, ""},
-        {2000, 873, "longer than one", 1, 22059, ""}};
-    for (const auto& c : edges) {
-        char area[10] = "";
-        size_t length = 0;
-        EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, c.to, area, c.room, c.from, c.text.data(), c.text.size(),
-                                              &length)), c.answer) << c.text;
-        EXPECT_EQ(std::string_view(area, length), c.result) << c.text;
-    }
+        {2000, 873, "longer than one", 1, 22059, ""}, {31, 873, {}, 8, 0, ""}};
+    for (const auto& c : edges) EXPECT_EQ(convert(c.to, c.from, c.text, c.room), std::pair(c.answer, c.result)) << c.text;
     ub2 units[4] = {};
     char bytes[8] = "";
-    size_t length = 7;
-    EXPECT_EQ(Answer(OCINlsCharSetConvert(env_, err_, 31, bytes, 8, 873, nullptr, 0, &length)), 0);
-    EXPECT_EQ(length, 0u);
+    size_t length = 0;
     Nls(178);
     EXPECT_EQ(OCICharSetToUnicode(env_, units, 4, Text("a\x80"), 2, &length), OCI_SUCCESS);
     EXPECT_EQ(units[1] * 10 + length, 0x20ACu * 10 + 2);
@@ -110,67 +104,46 @@ TEST_F(NlsCalls, NamesAndSettings) {
 
 TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     Nls(178, 171);
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
-    auto* statement = New<OCIStmt>(OCI_HTYPE_STMT);
-    const struct { ub1 form; ub2 set; std::string_view in, out; } cases[] = {
-        {SQLCS_IMPLICIT, 0, "\x80", "\xe9\x80"}, {SQLCS_NCHAR, 0, "\xc4", "??"}, {SQLCS_IMPLICIT, 873, "€", "\xe9\x80"}};
-    for (const auto& c : cases) {    // the last is read back in the environment's own set
-        const char* sql = "select '\xe9' || :v as \"\xe4\" from dual";
-        EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT)), 0);
-        OCIBind* bind = nullptr;
-        OCIDefine* define = nullptr;
-        char value[4] = "", area[8] = "";
-        ub2 length = 0;
-        c.in.copy(value, sizeof value);
-        EXPECT_EQ(Answer(OCIBindByPos(statement, &bind, err_, 1, value, static_cast<sb4>(c.in.size()), SQLT_CHR, nullptr,
-                                      nullptr, nullptr, 0, nullptr, OCI_DEFAULT)), 0);
-        ub1 form = c.form;
-        ub2 set = c.set;
-        EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &form, 0, OCI_ATTR_CHARSET_FORM, err_)), 0);
-        EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &set, 0, OCI_ATTR_CHARSET_ID, err_)), 0);
-        EXPECT_EQ(Answer(OCIDefineByPos(statement, &define, err_, 1, area, 4, SQLT_AFC, nullptr, &length, nullptr,
-                                        OCI_DEFAULT)), 0);
-        EXPECT_EQ(Answer(OCIStmtExecute(svc, statement, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
-        std::string expected(c.out);
-        if (c.form == SQLCS_NCHAR) expected = "\xe9?";    // a letter that the environment's set lacks
-        expected.resize(4, ' ');
-        EXPECT_EQ(std::string_view(area, 4), expected);
-        set = 7;
-        EXPECT_EQ(Answer(OCIAttrSet(bind, OCI_HTYPE_BIND, &set, 0, OCI_ATTR_CHARSET_ID, err_)), 24329);
-    }
-    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select '\xe9' as \"\xe4\" from dual"), 27, OCI_NTV_SYNTAX, 0)), 0);
-    OCIDefine* padded = nullptr;
-    char area[8] = "";
-    ub2 wide = 2000;
-    EXPECT_EQ(Answer(OCIDefineByPos(statement, &padded, err_, 1, area, 8, SQLT_AFC, nullptr, nullptr, nullptr, 0)), 0);
-    EXPECT_EQ(Answer(OCIAttrSet(padded, OCI_HTYPE_DEFINE, &wide, 0, OCI_ATTR_CHARSET_ID, err_)), 0);
-    EXPECT_EQ(Answer(OCIStmtExecute(svc, statement, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT)), 0);
-    EXPECT_EQ(std::string_view(area, 8), std::string_view("\0\xe9\0 \0 \0 ", 8));
-    dvoid* column = nullptr;
-    OraText* name = nullptr;
-    ub4 size = 0;
-    EXPECT_EQ(Answer(OCIParamGet(statement, OCI_HTYPE_STMT, err_, &column, 1)), 0);
-    EXPECT_EQ(Answer(OCIAttrGet(column, OCI_DTYPE_PARAM, &name, &size, OCI_ATTR_NAME, err_)), 0);
-    EXPECT_EQ(std::string_view(reinterpret_cast<char*>(name), size), "\xe4");
     EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 178);
     EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_NCHARSET_ID), 171);
-    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select '\x81' from dual"), 20, OCI_NTV_SYNTAX, 0)), 24501);
-    EXPECT_EQ(Answer(OCIStmtPrepare(statement, err_, Text("select 1 from dual\0\x81"), 20, OCI_NTV_SYNTAX, 0)), 0)
-        << "it ends at its zero";
-    OCIStmt* tagged = nullptr;
-    OCIBind* bind = nullptr;
+    OCISvcCtx* svc = nullptr;
+    ASSERT_EQ(LogOn(&svc, ":memory:"), 0);
+    StatementCalls calls{env_, err_, svc, New<OCIStmt>(OCI_HTYPE_STMT)};
+    const auto set = [&](dvoid* handle, ub4 type, ub4 attribute, auto value) {
+        return Answer(OCIAttrSet(handle, type, &value, 0, attribute, err_));
+    };
+    // What is bound and read back: in the environment's own set, in the national one, in one that is told.
+    const struct { ub1 form; ub2 set; std::string_view in, out; } cases[] = {
+        {SQLCS_IMPLICIT, 0, "\x80", "\xe9\x80  "}, {SQLCS_NCHAR, 0, "\xc4", "\xe9?  "}, {SQLCS_IMPLICIT, 873, "€", "\xe9\x80  "}};
+    for (const auto& c : cases) {
+        OCIBind* bind = nullptr;
+        char value[4] = "", area[8] = "";
+        c.in.copy(value, sizeof value);
+        MUST(calls.Prepare("select '\xe9' || :v as \"\xe4\" from dual"),
+             calls.Bind(&bind, 1, {value, static_cast<sb4>(c.in.size()), SQLT_CHR}),
+             set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_FORM, c.form), set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_ID, c.set),
+             calls.Define(1, {area, 4, SQLT_AFC}), calls.Execute());
+        EXPECT_EQ(std::string_view(area, 4), c.out);
+        EXPECT_EQ(set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_ID, ub2{7}), 24329);
+    }
+    OCIDefine* padded = nullptr;
+    char area[8] = "";
+    MUST(calls.Prepare("select '\xe9' as \"\xe4\" from dual"), calls.Define(&padded, 1, {area, 8, SQLT_AFC}),
+         set(padded, OCI_HTYPE_DEFINE, OCI_ATTR_CHARSET_ID, ub2{2000}), calls.Execute());
+    EXPECT_EQ(std::string_view(area, 8), std::string_view("\0\xe9\0 \0 \0 ", 8));
+    EXPECT_EQ(calls.ColumnName(calls.Column(1)), "\xe4");
+    // Bytes that are no text.
+    EXPECT_EQ(calls.Prepare("select '\x81' from dual"), 24501);
+    EXPECT_EQ(calls.Prepare({"select 1 from dual\0\x81", 20}), 0) << "it ends at its zero";
     const auto prepare = [&](const char* sql, const char* tag) {
-        return Answer(OCIStmtPrepare2(svc, &tagged, err_, Text(sql), Length(sql), Text(tag), Length(tag), OCI_NTV_SYNTAX, 0));
+        return Answer(OCIStmtPrepare2(svc, &calls.stmt, err_, Text(sql), Length(sql), Text(tag), Length(tag), OCI_NTV_SYNTAX, 0));
     };
     EXPECT_EQ(prepare("select '\x81' from dual", "a"), 24501);
     EXPECT_EQ(prepare("select 1 from dual", "\x81"), 24501);
     EXPECT_EQ(prepare("select 1 from dual", "a"), 0);
-    EXPECT_EQ(Answer(OCIBindByName(tagged, &bind, err_, Text(":\x81"), 2, area, 8, SQLT_AFC, nullptr, nullptr, nullptr,
-                                   0, nullptr, 0)), 24501);
-    EXPECT_EQ(Answer(OCIStmtRelease(tagged, err_, Text("\x81"), 1, OCI_DEFAULT)), 24501);
-    EXPECT_EQ(Answer(OCIStmtRelease(tagged, err_, nullptr, 0, OCI_DEFAULT)), 0);
-    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
+    EXPECT_EQ(calls.BindName(":\x81", {area, 8, SQLT_AFC}), 24501);
+    EXPECT_EQ(Answer(OCIStmtRelease(calls.stmt, err_, Text("\x81"), 1, OCI_DEFAULT)), 24501);
+    SHOULD(Answer(OCIStmtRelease(calls.stmt, err_, nullptr, 0, OCI_DEFAULT)), Answer(OCILogoff(svc, err_)));
 }
 
 // Each text of the calls on values, where it has a byte that the environment's set lacks.
