@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "support/call_fixture.h"
+#include "support/own_memory.h"
 
 namespace {
 
@@ -104,24 +105,6 @@ TEST_F(CallsTest, PasswordsThatAreTooLong) {
     EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012);
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
 }
-
-// The application's memory functions, which count what is out.
-struct OwnMemory {
-    int out = 0;
-
-    static dvoid* Allocate(dvoid* context, size_t size) {
-        ++static_cast<OwnMemory*>(context)->out;
-        auto* block = static_cast<char*>(std::malloc(size + 1));
-        std::memset(block, 0x5A, size + 1);
-        block[0] = 0;
-        return block + 1;    // and aligned to nothing
-    }
-    static dvoid* Reallocate(dvoid*, dvoid*, size_t) { return nullptr; }
-    static void Free(dvoid* context, dvoid* block) {
-        --static_cast<OwnMemory*>(context)->out;
-        std::free(static_cast<char*>(block) - 1);
-    }
-};
 
 TEST_F(CallsTest, InitializeServesEnvInit) {
     OwnMemory memory;

@@ -113,7 +113,7 @@ TEST(CharacterSets, NoPairIsTornAndWhatIsMalformedIsReplaced) {
 TEST(TextToBuffer, CutsBetweenCharacters) {
     const std::string_view text = "\xC3\xA4\xF0\x9F\x98\x80z";    // 2, 4 and 1 bytes; 1, 2 and 1 units
     const struct { std::uint32_t mode; std::vector<std::size_t> lengths; } cases[] = {
-        {OCI_DEFAULT, {0, 0, 2, 2, 2, 2, 6, 7}}, {OCI_UTF16, {0, 0, 2, 2, 2, 2, 6, 6, 8}}};    // with room for so many and the zero
+        {OCI_DEFAULT, {0, 0, 2, 2, 2, 2, 6, 7}}, {OCI_UTF16, {0, 0, 2, 2, 2, 2, 6, 6, 8}}};    // in 0, 1, ... and the zero
     for (const auto& [mode, lengths] : cases) {
         Environment* environment = Environment::Open(mode, Environment::SetsOf(mode), {}, 0);
         std::string kept;
@@ -121,7 +121,10 @@ TEST(TextToBuffer, CutsBetweenCharacters) {
         const std::size_t zero = mode == OCI_UTF16 ? 2 : 1;
         for (std::size_t room = 0; room < lengths.size() + zero; ++room) {
             std::string expected(32, 'x'), buffer = expected;
-            if (room >= zero) expected.replace(0, lengths[room - zero] + zero, std::string(whole.substr(0, lengths[room - zero])) + std::string(zero, '\0'));
+            if (room >= zero) {
+                const std::size_t length = lengths[room - zero];
+                expected.replace(0, length, whole.substr(0, length)).replace(length, zero, zero, '\0');
+            }
             EXPECT_EQ(TextToBuffer(*environment, text, buffer.data(), room), room == whole.size() + zero) << room;
             EXPECT_EQ(buffer, expected) << room;
         }

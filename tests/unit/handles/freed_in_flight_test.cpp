@@ -11,46 +11,11 @@
 
 #include "support/at_once.h"
 #include "support/call_fixture.h"
+#include "support/own_memory.h"
 
 namespace {
 
 using namespace std::chrono_literals;
-
-// The memory functions of an environment. The nth allocation calls `strike`, which frees the victim: its block must
-// outlast that, since the call that allocates is not over. Freed blocks are overwritten.
-struct StrikingMemory {
-    int countdown = 0;    // 0: not armed
-    std::function<void()> strike;
-    const void* victim = nullptr;
-    bool striking = false;
-    int struck = 0, too_early = 0;
-    int out = 0;
-
-    static dvoid* Allocate(dvoid* context, size_t size) {
-        auto& memory = *static_cast<StrikingMemory*>(context);
-        if (memory.countdown > 0 && --memory.countdown == 0) {
-            ++memory.struck;
-            memory.striking = true;
-            memory.strike();
-            memory.striking = false;
-        }
-        ++memory.out;
-        auto* block = static_cast<char*>(std::malloc(size + sizeof size));
-        std::memcpy(block, &size, sizeof size);
-        return block + sizeof size;
-    }
-    static void Free(dvoid* context, dvoid* given) {
-        auto& memory = *static_cast<StrikingMemory*>(context);
-        --memory.out;
-        size_t size = 0;
-        char* block = static_cast<char*>(given) - sizeof size;
-        std::memcpy(&size, block, sizeof size);
-        const auto* victim = static_cast<const char*>(memory.victim);
-        if (memory.striking && victim >= given && victim < static_cast<char*>(given) + size) ++memory.too_early;
-        std::memset(block, 0xDD, size + sizeof size);
-        std::free(block);
-    }
-};
 
 // What calls work on, in an environment of its own; each may be freed at any time.
 struct Objects {
@@ -60,9 +25,10 @@ struct Objects {
     OCIStmt* stmt = nullptr;
     OCIString* string = nullptr;
 
-    void Make(const char* sql, StrikingMemory* memory = nullptr) {
-        ASSERT_EQ(OCIEnvCreate(&env, OCI_THREADED, memory, memory ? StrikingMemory::Allocate : nullptr, nullptr,
-                               memory ? StrikingMemory::Free : nullptr, 0, nullptr), OCI_SUCCESS);
+    void Make(const char* sql, OwnMemory* memory = nullptr) {
+        const sword made = memory ? memory->Open(&env, OCI_THREADED)
+                                  : OCIEnvCreate(&env, OCI_THREADED, nullptr, nullptr, nullptr, nullptr, 0, nullptr);
+        ASSERT_EQ(made, OCI_SUCCESS);
         err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
         ASSERT_EQ(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(":memory:"), 8), OCI_SUCCESS);
         stmt = NewStatement(sql);
@@ -80,13 +46,29 @@ struct Objects {
 
 // ---- By callbacks
 
-// What a call of the cases works on. All of it may be freed by the strike.
+// What a call of the cases works on. The nth allocation of a call calls `strike`, which frees the victim: its block must
+// outlast that, since the call that allocates is not over.
 struct Struck : Objects {
-    StrikingMemory memory;
+    OwnMemory memory;
+    int countdown = 0;    // 0: not armed
+    std::function<void()> strike;
+    const void* victim = nullptr;
+    bool striking = false;
+    int struck = 0, too_early = 0;
     OCIString* source = nullptr;
     dvoid* cursor = nullptr;
 
     Struck() {
+        memory.before_allocating = [this] {
+            if (countdown == 0 || --countdown > 0) return;
+            ++struck;
+            striking = true;
+            strike();
+            striking = false;
+        };
+        memory.before_freeing = [this](const char* block, size_t size) {
+            too_early += striking && victim >= block && victim < block + size;
+        };
         Make("begin open :c for select 1 from dual; end;", &memory);
         SHOULD(OCIStringAssignText(env, err, Text("a longer text"), 13, &source), Bind());
     }
@@ -140,18 +122,18 @@ TEST(Callbacks, MayFreeWhateverTheirCallWorksOn) {
                 Struck objects;
                 OCIEnv* const env = objects.env;
                 dvoid* const victim = strike.victim(objects);
-                objects.memory.victim = victim;
-                objects.memory.strike = [&] {
+                objects.victim = victim;
+                objects.strike = [&] {
                     if (strike.strike) strike.strike(objects);
                     else OCIHandleFree(victim, strike.type);
                 };
-                objects.memory.countdown = nth;
+                objects.countdown = nth;
                 const sword rc = call.call(objects);
-                objects.memory.countdown = 0;
-                struck += objects.memory.struck;
+                objects.countdown = 0;
+                struck += objects.struck;
                 OCIHandleFree(env, OCI_HTYPE_ENV);
-                EXPECT_TRUE((rc == OCI_SUCCESS || rc == OCI_ERROR) && objects.memory.too_early + objects.memory.out == 0)
-                    << call.name << " frees " << strike.name << ": " << rc << ", " << objects.memory.too_early
+                EXPECT_TRUE((rc == OCI_SUCCESS || rc == OCI_ERROR) && objects.too_early + objects.memory.out == 0)
+                    << call.name << " frees " << strike.name << ": " << rc << ", " << objects.too_early
                     << " blocks too early, " << objects.memory.out << " never";
             }
         }
@@ -164,11 +146,11 @@ TEST(Callbacks, MayFreeWhateverTheirCallWorksOn) {
 TEST(Callbacks, MayChangeTheStringsThatTheirCallWorksOn) {
     for (const bool source : {true, false}) {
         Struck objects;
-        objects.memory.strike = [&] {
+        objects.strike = [&] {
             OCIString*& changed = source ? objects.source : objects.string;
             OCIStringAssignText(objects.env, objects.err, Text("other content, longer than before"), 33, &changed);
         };
-        objects.memory.countdown = 1;
+        objects.countdown = 1;
         ASSERT_EQ(OCIStringAssign(objects.env, objects.err, objects.source, &objects.string), OCI_SUCCESS);
         const std::string seen(reinterpret_cast<char*>(OCIStringPtr(objects.env, objects.string)),
                                OCIStringSize(objects.env, objects.string));
@@ -236,21 +218,6 @@ INSTANTIATE_TEST_SUITE_P(Order, FreedInFlight, testing::Values(
         OCIHandleFree(shared.stmt, OCI_HTYPE_STMT);
     }));
 
-// The memory functions of an environment in which an allocation waits until it may go on: a call that is in.
-struct Gate {
-    std::atomic<bool> armed{false}, in{false}, open{false};
-
-    static dvoid* Allocate(dvoid* context, size_t size) {
-        auto& gate = *static_cast<Gate*>(context);
-        if (gate.armed) {
-            gate.in = true;
-            while (!gate.open) std::this_thread::yield();
-        }
-        return std::malloc(size);
-    }
-    static void Free(dvoid*, dvoid* memory) { std::free(memory); }
-};
-
 // A statement with open rows is freed while a call elsewhere is in, so that the end of that call destroys it, in its own
 // thread, beside a thread that works on the statement's session and then logs off.
 TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
@@ -261,18 +228,21 @@ TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
         shared.Make(sql);
         OCIStmt* other = shared.NewStatement(sql);
         ASSERT_EQ(shared.Execute(shared.stmt), OCI_SUCCESS);
-        Gate gate;
+        OwnMemory gate;    // an allocation waits in it until it may go on: a call that is in
         OCIEnv* elsewhere = nullptr;
-        ASSERT_EQ(OCIEnvCreate(&elsewhere, OCI_THREADED, &gate, Gate::Allocate, nullptr, Gate::Free, 0, nullptr), 0);
-        gate.armed = true;
+        ASSERT_EQ(gate.Open(&elsewhere, OCI_THREADED), OCI_SUCCESS);
+        std::atomic<bool> is_in{false}, open{false};
+        gate.before_allocating = [&] {
+            for (is_in = true; !open;) std::this_thread::yield();
+        };
         std::thread in([&] {
             dvoid* handle = nullptr;
             EXPECT_EQ(OCIHandleAlloc(elsewhere, &handle, OCI_HTYPE_ERROR, 0, nullptr), OCI_SUCCESS);
         });
-        while (!gate.in) std::this_thread::yield();
+        while (!is_in) std::this_thread::yield();
         EXPECT_EQ(OCIHandleFree(shared.stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
         std::thread working([&] {
-            gate.open = true;
+            open = true;
             for (int call = 0; call < round % 10; ++call) EXPECT_EQ(shared.Execute(other), OCI_SUCCESS);
             EXPECT_EQ(OCILogoff(shared.svc, shared.err), OCI_SUCCESS);
         });
@@ -329,44 +299,31 @@ protected:
     OCIError* wait_err_ = nullptr;
 };
 
-TEST_F(BesideAWait, ForAThreadToEnd) {
+TEST_F(BesideAWait, ForAThreadAMutexAPipe) {
     static std::atomic<bool> stop;
     stop = false;
     OCIThreadHandle* handle = nullptr;
-    ASSERT_EQ(OCIThreadHndInit(env_, err_, &handle), OCI_SUCCESS);
     const auto routine = [](dvoid*) { while (!stop) std::this_thread::sleep_for(1ms); };
-    ASSERT_EQ(OCIThreadCreate(env_, err_, routine, nullptr, nullptr, handle), OCI_SUCCESS);
+    MUST(OCIThreadHndInit(env_, err_, &handle), OCIThreadCreate(env_, err_, routine, nullptr, nullptr, handle));
     MakeAndFree([&] { EXPECT_EQ(OCIThreadJoin(env_, wait_err_, handle), OCI_SUCCESS); }, [] { stop = true; });
-}
 
-TEST_F(BesideAWait, ForAMutex) {
     OCIThreadMutex* mutex = nullptr;
     MUST(OCIThreadMutexInit(env_, err_, &mutex), OCIThreadMutexAcquire(env_, err_, mutex));
     MakeAndFree(
-        [&] {
-            SHOULD(OCIThreadMutexAcquire(env_, wait_err_, mutex), OCIThreadMutexRelease(env_, wait_err_, mutex));
-        },
+        [&] { SHOULD(OCIThreadMutexAcquire(env_, wait_err_, mutex), OCIThreadMutexRelease(env_, wait_err_, mutex)); },
         [&] { EXPECT_EQ(OCIThreadMutexRelease(env_, err_, mutex), OCI_SUCCESS); });
-}
 
-TEST_F(BesideAWait, ForAPipe) {
-    const std::string name = "/tmp/kelp-pipe-" + std::to_string(getpid());
-    MUST(mkfifo(name.c_str(), 0600), OCIFileInit(env_, err_));
+    const std::string name = Folder() + "/pipe";
     OCIFileObject* file = nullptr;
+    MUST(mkfifo(name.c_str(), 0600), OCIFileInit(env_, err_));
     const int other_end = open(name.c_str(), O_RDWR);
     ASSERT_EQ(OCIFileOpen(env_, err_, &file, Text(name), nullptr, OCI_FILE_READ_ONLY, OCI_FILE_EXIST, OCI_FILE_BIN), 0);
-    MakeAndFree(
-        [&] {
-            char byte = 0;
-            ub4 count = 0;
-            EXPECT_EQ(OCIFileRead(env_, wait_err_, file, &byte, 1, &count), OCI_SUCCESS);
-            EXPECT_EQ(byte, 'k');
-        },
-        [&] { EXPECT_EQ(write(other_end, "k", 1), 1); });
-    EXPECT_EQ(OCIFileClose(env_, err_, file), OCI_SUCCESS);
-    close(other_end);
-    unlink(name.c_str());
-    EXPECT_EQ(OCIFileTerm(env_, err_), OCI_SUCCESS);
+    char byte = 0;
+    ub4 count = 0;
+    MakeAndFree([&] { EXPECT_EQ(OCIFileRead(env_, wait_err_, file, &byte, 1, &count), OCI_SUCCESS); },
+                [&] { EXPECT_EQ(write(other_end, "k", 1), 1); });
+    EXPECT_EQ(byte, 'k');
+    SHOULD(OCIFileClose(env_, err_, file), OCIFileTerm(env_, err_), close(other_end));
 }
 
 // One thread runs the query, a second one waits for its turn on the same session.

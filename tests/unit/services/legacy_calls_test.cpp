@@ -28,7 +28,8 @@ struct Login {
         return obndrv(&cda, Text(name), -1, static_cast<ub1*>(value), length, type, -1, nullptr, nullptr, -1, -1);
     }
     sword Define(sword position, void* value, sword length, sword type) {
-        return odefin(&cda, position, static_cast<ub1*>(value), length, type, -1, nullptr, nullptr, -1, -1, nullptr, nullptr);
+        return odefin(&cda, position, static_cast<ub1*>(value), length, type, -1, nullptr, nullptr, -1, -1, nullptr,
+                      nullptr);
     }
     // Until it is done, with the number of times that it was not.
     template <class Call>
@@ -147,7 +148,8 @@ TEST_F(LegacyCalls, LocksAreWaitedFor) {
     const std::filesystem::path file =
         std::filesystem::temp_directory_path() / ("legacy_calls_" + std::to_string(getpid()));
     Login holding, waiting;
-    for (Login* login : {&holding, &waiting}) MUST(login->LogOn(user, server ? database : file.string()), login->Open());
+    if (!server) database = file;
+    for (Login* login : {&holding, &waiting}) MUST(login->LogOn(user, database), login->Open());
     ASSERT_EQ(server ? 0 : waiting.Run("create table t (n integer, c varchar2(10))"), 0);
     MUST(waiting.Run("insert into t values (1, 'a')"), ocom(&waiting.lda), holding.Run("update t set c = 'b'"));
     std::thread releasing([&] {
@@ -255,7 +257,8 @@ TEST_F(LegacyCalls, AreasInTwoThreads) {
         SHOULD(own.LogOn(user, database, thread % 2), own.Open());
         for (int round = 0; round < 20; ++round) {
             int value = 0;
-            SHOULD(own.Parse("select 1 + :n from dual"), own.Bind(":n", &round, 4, SQLT_INT), own.Define(1, &value, 4, SQLT_INT));
+            SHOULD(own.Parse("select 1 + :n from dual"), own.Bind(":n", &round, 4, SQLT_INT),
+                   own.Define(1, &value, 4, SQLT_INT));
             EXPECT_EQ(own.Finish([&] { return oexfet(&own.cda, 1, 0, 1); }), 0);
             sum += value;
         }

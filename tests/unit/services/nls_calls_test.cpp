@@ -19,8 +19,8 @@ TEST_F(NlsCalls, TextsAreConverted) {
     const auto convert = [&](ub2 to, ub2 from, std::string_view text, size_t room = 20) {
         char area[20] = "";
         size_t length = 0;
-        const sb4 answer = Answer(OCINlsCharSetConvert(env_, err_, to, area, room, from, text.data(), text.size(), &length));
-        return std::pair(answer, std::string(area, length));
+        const sword code = OCINlsCharSetConvert(env_, err_, to, area, room, from, text.data(), text.size(), &length);
+        return std::pair(Answer(code), std::string(area, length));
     };
     const struct { ub2 set; std::string_view text, utf8; } cases[] = {
         {178, "Z\xfcr\x80", "Zür€"}, {171, "\xc4\xe0", "Да"}, {46, "\xa4\xe9", "€é"}, {170, "\xa3\x9f", "Łź"},
@@ -136,7 +136,8 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     EXPECT_EQ(calls.Prepare("select '\x81' from dual"), 24501);
     EXPECT_EQ(calls.Prepare({"select 1 from dual\0\x81", 20}), 0) << "it ends at its zero";
     const auto prepare = [&](const char* sql, const char* tag) {
-        return Answer(OCIStmtPrepare2(svc, &calls.stmt, err_, Text(sql), Length(sql), Text(tag), Length(tag), OCI_NTV_SYNTAX, 0));
+        return Answer(OCIStmtPrepare2(svc, &calls.stmt, err_, Text(sql), Length(sql), Text(tag), Length(tag),
+                                      OCI_NTV_SYNTAX, OCI_DEFAULT));
     };
     EXPECT_EQ(prepare("select '\x81' from dual", "a"), 24501);
     EXPECT_EQ(prepare("select 1 from dual", "\x81"), 24501);

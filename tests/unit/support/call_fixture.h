@@ -109,8 +109,8 @@ protected:
                                Text(database), Length(database)));
     }
     sb4 Run(OCISvcCtx* svc, OCIStmt* stmt, OCIError* err, const char* sql, ub4 iterations) const {
-        const sb4 prepared = Answer(OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT), err);
-        if (prepared != 0) return prepared;
+        const sword code = OCIStmtPrepare(stmt, err, Text(sql), Length(sql), OCI_NTV_SYNTAX, OCI_DEFAULT);
+        if (code != OCI_SUCCESS) return Answer(code, err);
         return Answer(OCIStmtExecute(svc, stmt, err, iterations, 0, nullptr, nullptr, OCI_DEFAULT), err);
     }
     // In a statement of its own.
