@@ -42,6 +42,25 @@ TEST_F(Executing, RowsReturnedByTheLastExecution) {
     }
 }
 
+TEST_F(Executing, BlocksWhoseCommitFails) {
+    MustRun("create table t(a number primary key)");
+    MustRun("create table c(id integer references t deferrable initially deferred)", "commit");
+    EXPECT_EQ(Run("begin insert into c values(77); commit; insert into c values(88); end;"), 2091);
+    EXPECT_EQ(One("select count(*) from c"), "0");
+}
+
+// A value that does not fit its place undoes the row that gave it.
+TEST_F(Executing, ReturningWhatDoesNotFit) {
+    MustRun("create table t(a number)");
+    sb4 in[3] = {1, 1000, 3};
+    sb1 out[3] = {};
+    ASSERT_EQ(Ready("insert into t values(:a) returning a into :b", {Int(in), Int(out)}), 0);
+    EXPECT_EQ(Execute(3), 1455);
+    EXPECT_EQ(Execute(3, OCI_BATCH_ERRORS), 24381);
+    EXPECT_EQ(One("select group_concat(a) from t"), "1,1,3");
+    EXPECT_EQ(out[2], 3);
+}
+
 // Counts of elements around the room there is, in and out.
 TEST_F(Executing, TablesAtTheirLimits) {
     MustRun("create table t(a number primary key)");
