@@ -109,11 +109,11 @@ TEST(CharacterSets, NoPairIsTornAndWhatIsMalformedIsReplaced) {
     }
 }
 
-// Nothing is written behind the room, and what is written is whole characters.
+// Nothing is written behind the room, and what is written is whole characters: so many bytes in 0, 1, ... and the zero.
 TEST(TextToBuffer, CutsBetweenCharacters) {
     const std::string_view text = "\xC3\xA4\xF0\x9F\x98\x80z";    // 2, 4 and 1 bytes; 1, 2 and 1 units
     const struct { std::uint32_t mode; std::vector<std::size_t> lengths; } cases[] = {
-        {OCI_DEFAULT, {0, 0, 2, 2, 2, 2, 6, 7}}, {OCI_UTF16, {0, 0, 2, 2, 2, 2, 6, 6, 8}}};    // in 0, 1, ... and the zero
+        {OCI_DEFAULT, {0, 0, 2, 2, 2, 2, 6, 7}}, {OCI_UTF16, {0, 0, 2, 2, 2, 2, 6, 6, 8}}};
     for (const auto& [mode, lengths] : cases) {
         Environment* environment = Environment::Open(mode, Environment::SetsOf(mode), {}, 0);
         std::string kept;

@@ -114,14 +114,16 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     };
     // What is bound and read back: in the environment's own set, in the national one, in one that is told.
     const struct { ub1 form; ub2 set; std::string_view in, out; } cases[] = {
-        {SQLCS_IMPLICIT, 0, "\x80", "\xe9\x80  "}, {SQLCS_NCHAR, 0, "\xc4", "\xe9?  "}, {SQLCS_IMPLICIT, 873, "€", "\xe9\x80  "}};
+        {SQLCS_IMPLICIT, 0, "\x80", "\xe9\x80  "}, {SQLCS_NCHAR, 0, "\xc4", "\xe9?  "},
+        {SQLCS_IMPLICIT, 873, "€", "\xe9\x80  "}};
     for (const auto& c : cases) {
         OCIBind* bind = nullptr;
         char value[4] = "", area[8] = "";
         c.in.copy(value, sizeof value);
         MUST(calls.Prepare("select '\xe9' || :v as \"\xe4\" from dual"),
              calls.Bind(&bind, 1, {value, static_cast<sb4>(c.in.size()), SQLT_CHR}),
-             set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_FORM, c.form), set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_ID, c.set),
+             set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_FORM, c.form),
+             set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_ID, c.set),
              calls.Define(1, {area, 4, SQLT_AFC}), calls.Execute());
         EXPECT_EQ(std::string_view(area, 4), c.out);
         EXPECT_EQ(set(bind, OCI_HTYPE_BIND, OCI_ATTR_CHARSET_ID, ub2{7}), 24329);
