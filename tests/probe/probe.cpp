@@ -241,35 +241,51 @@ void Show(State& state, const Output& shown, const std::vector<Argument>& argume
 
 // --- Callbacks ------------------------------------------------------------------------------------------------------
 
-template <class... Arguments> std::string Numbers(Arguments... arguments) {
-    std::string text;
-    ((text += (text.empty() ? "" : ", ") + std::to_string(arguments)), ...);
-    return text;
+using Words = std::vector<std::string>;
+
+template <class T = ub4> T Number(const Words& words, size_t index) { return static_cast<T>(std::stoul(words[index])); }
+
+std::string Answered(const std::string& callback, sb4 rc) {
+    return "    probe: " + callback + " = " + std::to_string(rc);
+}
+
+void AppendPiece(std::string& line, ub1 piece, const void* data, long long length) {
+    line += ": piece " + std::to_string(piece) + ", ";
+    AppendText(line, data, length);
 }
 
 // in:ITERATION:INDEX asks for a value to bind.
-void CallIn(State& state, const std::vector<std::string>& words) {
+void CallIn(State& state, const Words& words) {
     const Installed& installed = state.installed;
-    void* data = nullptr;
+    void *data = nullptr, *indicator = nullptr;
     ub4 length = 0;
     ub1 piece = 0;
-    void* indicator = nullptr;
-    const auto iteration = static_cast<ub4>(std::stoul(words[1]));
-    const auto index = static_cast<ub4>(std::stoul(words[2]));
-    const sb4 rc = installed.in(installed.in_context, nullptr, iteration, index, &data, &length, &piece, &indicator);
-    std::string line = "    probe: in callback " + Numbers(iteration, index) + " = " + std::to_string(rc);
+    const sb4 rc = installed.in(installed.in_context, nullptr, Number(words, 1), Number(words, 2), &data, &length,
+                                &piece, &indicator);
+    std::string line = Answered("in callback " + words[1] + ", " + words[2], rc);
     if (rc == OCI_CONTINUE) {
-        line += ": piece " + std::to_string(piece) + ", ";
-        AppendText(line, data, data ? length : 0);
+        AppendPiece(line, piece, data, data ? length : 0);
         if (indicator) line += ", indicator " + std::to_string(Load<short>(indicator));
     }
     Print(state, line + "\n");
 }
 
-// What a callback that receives has given places for; `text` is put there as far as it fits.
-void Deliver(State& state, std::string line, sb4 rc, void* data, ub4* length, ub1 piece, void* indicator, ub2* code,
-             const std::string& text) {
-    line += " = " + std::to_string(rc);
+// out:ITERATION:INDEX:PIECE:TEXT delivers a piece to a bind, define:ITERATION:PIECE:TEXT one to a define: the text
+// is put in the place that the callback gives, as far as it fits.
+void CallOut(State& state, const Words& words) {
+    const Installed& installed = state.installed;
+    void *data = nullptr, *indicator = nullptr;
+    ub4* length = nullptr;
+    ub2* code = nullptr;
+    const bool is_define = words[0] == "define";
+    const std::string& text = words[is_define ? 3 : 4];
+    const auto iteration = Number(words, 1);
+    auto piece = Number<ub1>(words, is_define ? 2 : 3);
+    const sb4 rc = is_define ? installed.define(installed.define_context, nullptr, iteration, &data, &length, &piece,
+                                                &indicator, &code)
+                             : installed.out(installed.out_context, nullptr, iteration, Number(words, 2), &data,
+                                             &length, &piece, &indicator, &code);
+    std::string line = Answered(words[0] + " callback " + words[1] + (is_define ? "" : ", " + words[2]), rc);
     if (rc == OCI_CONTINUE && data && length) {
         line += ": piece " + std::to_string(piece) + ", room " + std::to_string(*length);
         *length = std::min(*length, static_cast<ub4>(text.size()));
@@ -280,34 +296,6 @@ void Deliver(State& state, std::string line, sb4 rc, void* data, ub4* length, ub
     Print(state, line + "\n");
 }
 
-// out:ITERATION:INDEX:PIECE:TEXT delivers a piece to a bind, define:ITERATION:PIECE:TEXT one to a define.
-void CallOut(State& state, const std::vector<std::string>& words) {
-    const Installed& installed = state.installed;
-    void *data = nullptr, *indicator = nullptr;
-    ub4* length = nullptr;
-    ub2* code = nullptr;
-    const auto iteration = static_cast<ub4>(std::stoul(words[1]));
-    const auto index = static_cast<ub4>(std::stoul(words[2]));
-    auto piece = static_cast<ub1>(std::stoul(words[3]));
-    const sb4 rc = installed.out(installed.out_context, nullptr, iteration, index, &data, &length, &piece, &indicator,
-                                 &code);
-    Deliver(state, "    probe: out callback " + Numbers(iteration, index), rc, data, length, piece, indicator, code,
-            words[4]);
-}
-
-void CallDefine(State& state, const std::vector<std::string>& words) {
-    const Installed& installed = state.installed;
-    void *data = nullptr, *indicator = nullptr;
-    ub4* length = nullptr;
-    ub2* code = nullptr;
-    const auto iteration = static_cast<ub4>(std::stoul(words[1]));
-    auto piece = static_cast<ub1>(std::stoul(words[2]));
-    const sb4 rc = installed.define(installed.define_context, nullptr, iteration, &data, &length, &piece, &indicator,
-                                    &code);
-    Deliver(state, "    probe: define callback " + Numbers(iteration), rc, data, length, piece, indicator, code,
-            words[3]);
-}
-
 std::string Bytes(const std::string& digits) {
     std::string bytes;
     for (size_t index = 0; index + 1 < digits.size(); index += 2)
@@ -316,32 +304,28 @@ std::string Bytes(const std::string& digits) {
 }
 
 // read:PIECE:BYTES delivers a piece of a LOB, write:ROOM asks for one.
-void CallRead(State& state, const std::vector<std::string>& words) {
+void CallRead(State& state, const Words& words) {
     const std::string bytes = Bytes(words.size() > 2 ? words[2] : "");
     const sb4 rc = state.installed.read(state.installed.lob_context, bytes.data(), static_cast<ub4>(bytes.size()),
-                                        static_cast<ub1>(std::stoul(words[1])));
-    Print(state, "    probe: read callback = " + std::to_string(rc) + "\n");
+                                        Number<ub1>(words, 1));
+    Print(state, Answered("read callback", rc) + "\n");
 }
 
-void CallWrite(State& state, const std::vector<std::string>& words) {
-    std::vector<char> room(std::stoul(words[1]));
+void CallWrite(State& state, const Words& words) {
+    std::vector<char> room(Number(words, 1));
     auto length = static_cast<ub4>(room.size());
     ub1 piece = 255;
     const sb4 rc = state.installed.write(state.installed.lob_context, room.data(), &length, &piece);
-    std::string line = "    probe: write callback = " + std::to_string(rc);
-    if (rc == OCI_CONTINUE) {
-        line += ": piece " + std::to_string(piece) + ", ";
-        AppendText(line, room.data(), std::min<long long>(length, static_cast<long long>(room.size())));
-    }
+    std::string line = Answered("write callback", rc);
+    if (rc == OCI_CONTINUE) AppendPiece(line, piece, room.data(), std::min<long long>(length, std::ssize(room)));
     Print(state, line + "\n");
 }
 
-void CallBack(State& state, const std::vector<std::string>& words) {
+void CallBack(State& state, const Words& words) {
     const Installed& installed = state.installed;
     const std::string& kind = words[0];
     if (kind == "in" && installed.in) CallIn(state, words);
-    else if (kind == "out" && installed.out) CallOut(state, words);
-    else if (kind == "define" && installed.define) CallDefine(state, words);
+    else if ((kind == "out" && installed.out) || (kind == "define" && installed.define)) CallOut(state, words);
     else if (kind == "read" && installed.read) CallRead(state, words);
     else if (kind == "write" && installed.write) CallWrite(state, words);
     else Print(state, "    probe: no " + kind + " callback\n");

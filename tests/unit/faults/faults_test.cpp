@@ -13,7 +13,7 @@
 #include <iostream>
 #include <thread>
 
-#include "faults/scenarios.h"
+#include "faults/world.h"
 
 namespace faults {
 namespace {

@@ -1,7 +1,8 @@
 // Queries: rows in arrays, scrolled, read ahead of what another statement writes, and in pieces.
 #include <cstring>
+#include <vector>
 
-#include "faults/scenarios.h"
+#include "faults/world.h"
 
 namespace faults {
 namespace {
@@ -18,15 +19,17 @@ void TableOfRows(World& w) {
 }
 
 struct Rows {
+    std::size_t unit = 6, room = 130;
     sb4 numbers[6] = {};
-    char texts[6][130] = {};
+    std::vector<char> texts = std::vector<char>(6 * room);
     void Define(World& w) {
         w.Define(1, {numbers, 4, SQLT_INT});
-        w.Define(2, {texts, 130, SQLT_STR});
+        w.Define(2, {texts.data(), static_cast<sb4>(room), SQLT_STR});
     }
     void Show(World& w, std::size_t count) const {
         for (std::size_t row = 0; row < count; ++row)
-            w.seen += std::to_string(numbers[row]) + (std::strlen(texts[row]) == numbers[row] * 6u ? "," : " wrong,");
+            w.seen += std::to_string(numbers[row]) +
+                      (std::strlen(&texts[row * room]) == numbers[row] * unit ? "," : " wrong,");
     }
 };
 
@@ -58,23 +61,26 @@ void ShowAll(World& w, Rows& rows) {
     }, [&] { ShowRest(w, rows); });
 }
 
-void FetchArrays(World& w) {
+SCENARIO(FetchArrays, session, TableOfRows, "1,2,3,4,5,6,7,8,9,10,11,12,13,14,15,16,17,18,19,20,18,19,20,") {
     Rows rows;
     w.Prepare("select a, b from t order by a");
     rows.Define(w);
     w.Execute(0);
     ShowAll(w, rows);
+    w.Prepare("select a, b from t where a > 17 order by a");
+    rows.Define(w);
+    w.Execute(3, OCI_EXACT_FETCH);
+    rows.Show(w, RowsFetched(w));
 }
 
 // The rows are read to the end before the other statement writes, and each takes memory of SQLite's: what fails there
-// may lose the transaction, and the change must not go on outside of it.
-template <ub4 mode>
-void FetchAhead(World& w) {
+// may lose the transaction, and the change must not go on outside of it. They are long: many lie on disk by then.
+void FetchAhead(World& w, ub4 mode) {
     EXPECT_EQ(w.One("select count(*) from other"), "0") << "what was rolled back";
     w.Sql("insert into other values(0)");
     w.Keeps("select count(*) from other", "1");
-    Rows rows;
-    w.Prepare("select a, printf('%.*c', a * 6, 'x') from t");
+    Rows rows{3500, 70001};
+    w.Prepare("select a, printf('%.*c', a * 3500, 'x') from t");
     rows.Define(w);
     w.Execute(0, mode);
     w.Fetch(6);
@@ -87,7 +93,10 @@ void FetchAhead(World& w) {
     ShowAll(w, rows);
 }
 
-void Scroll(World& w) {
+SCENARIO(FetchAheadOfAWriter, session, TableOfRows, kTwenty) { FetchAhead(w, OCI_DEFAULT); }
+SCENARIO(ScrollAheadOfAWriter, session, TableOfRows, kTwenty) { FetchAhead(w, OCI_STMT_SCROLLABLE_READONLY); }
+
+SCENARIO(Scroll, session, TableOfRows, "1,2,;20,;12,13,14,;1,2,;5,;4,;") {
     Rows rows;
     w.Prepare("select a, b from t order by a");
     rows.Define(w);
@@ -108,16 +117,8 @@ void Scroll(World& w) {
     }
 }
 
-void ExactFetch(World& w) {
-    Rows rows;
-    w.Prepare("select a, b from t where a > 17 order by a");
-    rows.Define(w);
-    w.Execute(3, OCI_EXACT_FETCH);
-    rows.Show(w, RowsFetched(w));
-}
-
 // Every column is read in pieces of five bytes.
-void PiecesOut(World& w) {
+SCENARIO(PiecesOut, session, TableOfRows, "xxxxxx1;xxxxxxxxxxxx2;xxxxxxxxxxxxxxxxxx3;100;") {
     w.Prepare("select b, a from t where a < 4 order by a");
     w.Define(1, {nullptr, 1, SQLT_CHR}, OCI_DYNAMIC_FETCH);
     w.Define(2, {nullptr, 1, SQLT_CHR}, OCI_DYNAMIC_FETCH);
@@ -126,13 +127,9 @@ void PiecesOut(World& w) {
         std::string value;
         sword code = w.Fetch();
         while (code == OCI_NEED_DATA) {
-            dvoid* handle = nullptr;
-            ub4 type = 0, iteration = 0, index = 0;
-            ub1 direction = 0, piece = 0;
-            w.STEP(OCIStmtGetPieceInfo, w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
             char buffer[5];
             ub4 length = sizeof buffer;
-            w.STEP(OCIStmtSetPieceInfo, handle, type, w.err, buffer, &length, piece, nullptr, nullptr);
+            w.Piece(buffer, length);
             code = w.Fetch();
             value.append(buffer, length);
         }
@@ -142,7 +139,8 @@ void PiecesOut(World& w) {
 }
 
 // One value in many forms: those of the packages, too.
-void ManyTypes(World& w) {
+SCENARIO(ManyTypes, session, TableOfRows,
+         "1235;2055;155;a text that is not short at all;225;18;1000000000000000000000000000000;") {
     OCINumber number{};
     OCIDate date{};
     ub1 seven[7] = {};
@@ -181,7 +179,7 @@ void ManyTypes(World& w) {
 }
 
 // A sort, groups and a subquery, through which SQLite keeps rows of its own.
-void SortsAndGroups(World& w) {
+SCENARIO(SortsAndGroups, session, TableOfRows, "50;42;39;36;33;4;") {
     char text[80] = "";
     sb4 number = 0;
     w.Prepare("select distinct substr(b, 1, 30) || mod(a, 5), sum(a) from t where a in (select a from t where a > 3) "
@@ -193,7 +191,7 @@ void SortsAndGroups(World& w) {
 }
 
 // The library's SQL functions and comparisons on values that are bound.
-void FunctionsOfBinds(World& w) {
+SCENARIO(FunctionsOfBinds, session, TableOfRows, "7;202401-JAN;701-JAN;") {
     char value[] = "01-JAN", text[40] = "";
     for (const char* sql : {"select a from t where to_date('03-FEB-24') > :x || '-24' and a = 7",
                             "select to_char(to_date('03-FEB-24'), 'YYYY') || :x as y from t where a = 7",
@@ -207,7 +205,7 @@ void FunctionsOfBinds(World& w) {
 }
 
 // Texts of the application's in UTF-16 on every way.
-void InUtf16(World& w) {
+SCENARIO(InUtf16, session, nullptr, "108;right;", OCI_UTF16) {
     const std::u16string_view sql = u"select 'a value of some length: ' || :x from dual";
     const auto bytes = [](std::u16string_view text) { return reinterpret_cast<const OraText*>(text.data()); };
     const std::u16string_view in = u"ÄÖÜ and more that is not short";
@@ -222,41 +220,5 @@ void InUtf16(World& w) {
     w.See(length);
     w.See(out[24] == u'Ä' ? "right" : "wrong");
 }
-
-// Long rows, of which many lie on disk when another statement writes.
-void LongRowsReadAhead(World& w) {
-    static char text[70001];
-    sb4 number = 0;
-    w.Prepare("select a, printf('%.*c', a * 3500, 'x') from t");
-    w.Define(1, {&number, 4, SQLT_INT});
-    w.Define(2, {text, sizeof text, SQLT_STR});
-    w.Execute(1);
-    w.Sql("insert into other values(1)");
-    long sum = number;
-    while (w.Fetch() == OCI_SUCCESS) {
-        sum += number;
-        EXPECT_EQ(std::strlen(text), number * 3500u);
-    }
-    w.See(sum);
-}
-
-constexpr Scenario kScenarios[] = {
-    {"FetchArrays", Ground::session, TableOfRows, FetchArrays, kTwenty},
-    {"FetchAheadOfAWriter", Ground::session, TableOfRows, FetchAhead<OCI_DEFAULT>, kTwenty},
-    {"ScrollAheadOfAWriter", Ground::session, TableOfRows, FetchAhead<OCI_STMT_SCROLLABLE_READONLY>, kTwenty},
-    {"Scroll", Ground::session, TableOfRows, Scroll, "1,2,;20,;12,13,14,;1,2,;5,;4,;"},
-    {"ExactFetch", Ground::session, TableOfRows, ExactFetch, "18,19,20,"},
-    {"PiecesOut", Ground::session, TableOfRows, PiecesOut, "xxxxxx1;xxxxxxxxxxxx2;xxxxxxxxxxxxxxxxxx3;100;"},
-    {"ManyTypes", Ground::session, TableOfRows, ManyTypes,
-     "1235;2055;155;a text that is not short at all;225;18;1000000000000000000000000000000;"},
-    {"SortsAndGroups", Ground::session, TableOfRows, SortsAndGroups, "50;42;39;36;33;4;"},
-    {"FunctionsOfBinds", Ground::session, TableOfRows, FunctionsOfBinds, "7;202401-JAN;701-JAN;"},
-    {"InUtf16", Ground::session, nullptr, InUtf16, "108;right;", OCI_UTF16},
-    {"LongRowsReadAhead", Ground::session, TableOfRows, LongRowsReadAhead, "210;"},
-};
-
 }  // namespace
-
-std::span<const Scenario> FetchScenarios() { return kScenarios; }
-
 }  // namespace faults

@@ -4,7 +4,7 @@
 #include <thread>
 #include <vector>
 
-#include "faults/scenarios.h"
+#include "faults/world.h"
 
 namespace faults {
 namespace {
@@ -18,18 +18,17 @@ void OwnEnvironment(World& w) {
 }
 
 void CreateEnvironment(World& w) {
-    w.Step("OCIEnvCreate", [&] {
-        return OCIEnvCreate(&w.env, w.mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release,
-                            16, nullptr);
-    }, Told::code);
+    w.STEP_TOLD(Told::code, OCIEnvCreate, &w.env, w.mode, nullptr, ApplicationMemory::Allocate, nullptr,
+                ApplicationMemory::Release, 16, nullptr);
     OwnEnvironment(w);
 }
 
 void LogOffAtEnd(World& w) {
-    w.AtEnd([&w] { return OCILogoff(std::exchange(w.svc, nullptr), w.err); });
+    w.AtEnd([&w, svc = w.svc] { return w.svc = nullptr, OCILogoff(svc, w.err); });
 }
 
 void LogOn(World& w, std::string_view user, std::string_view password, std::string_view database) {
+    w.svc = nullptr;
     w.STEP(OCILogon, w.env, w.err, &w.svc, user.empty() ? nullptr : World::Text(user), World::Size(user),
            user.empty() ? nullptr : World::Text(password), World::Size(password), World::Text(database),
            World::Size(database));
@@ -37,7 +36,7 @@ void LogOn(World& w, std::string_view user, std::string_view password, std::stri
 }
 
 // A statement from nothing to its first row.
-void FromNothing(World& w) {
+SCENARIO(FromNothing, nothing, nullptr, "abc;", OCI_THREADED | OCI_OBJECT, true) {
     CreateEnvironment(w);
     LogOn(w, "", "", ":memory:");
     w.stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
@@ -49,12 +48,11 @@ void FromNothing(World& w) {
 }
 
 // The older way in, and a logon that brings the statement cache along.
-void InitializeAndLogOn2(World& w) {
-    w.Step("OCIInitialize", [&] {
-        return OCIInitialize(w.mode, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release);
-    }, Told::code);
+SCENARIO(InitializeAndLogOn2, nothing, nullptr, "20;") {
+    w.STEP_TOLD(Told::code, OCIInitialize, w.mode, nullptr, ApplicationMemory::Allocate, nullptr,
+                ApplicationMemory::Release);
     w.AtEnd([] { return OCITerminate(OCI_DEFAULT); });
-    w.Step("OCIEnvInit", [&] { return OCIEnvInit(&w.env, OCI_DEFAULT, 16, nullptr); }, Told::code);
+    w.STEP_TOLD(Told::code, OCIEnvInit, &w.env, OCI_DEFAULT, 16, nullptr);
     OwnEnvironment(w);
     w.STEP(OCILogon2, w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8, OCI_LOGON2_STMTCACHE);
     LogOffAtEnd(w);
@@ -64,53 +62,41 @@ void InitializeAndLogOn2(World& w) {
 }
 
 // Frees what another thread made undisturbed: an end takes no memory, even as a thread's first call.
-void FreeingTakesNoMemory(World& w) {
-    OCIEnv* env = nullptr;
-    dvoid* err = nullptr;
-    dvoid* stmt = nullptr;
+SCENARIO(FreeingTakesNoMemory, nothing, nullptr, "freed;", OCI_DEFAULT, true) {
+    std::unique_ptr<World> other;
     dvoid* descriptor = nullptr;
-    OCISvcCtx* svc = nullptr;
     std::thread([&] {
-        OCIEnvCreate(&env, OCI_DEFAULT, nullptr, ApplicationMemory::Allocate, nullptr, ApplicationMemory::Release, 0,
-                     nullptr);
-        OCIHandleAlloc(env, &err, OCI_HTYPE_ERROR, 0, nullptr);
-        auto* const error = static_cast<OCIError*>(err);
-        OCILogon(env, error, &svc, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8);
-        OCIHandleAlloc(env, &stmt, OCI_HTYPE_STMT, 0, nullptr);
-        OCIDescriptorAlloc(env, &descriptor, OCI_DTYPE_TIMESTAMP, 0, nullptr);
-        auto* const query = static_cast<OCIStmt*>(stmt);
-        OCIStmtPrepare(query, error, World::Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT);
-        EXPECT_EQ(OCIStmtExecute(svc, query, error, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
+        other = std::make_unique<World>(session, OCI_DEFAULT);
+        other->Begin();
+        OCIDescriptorAlloc(other->env, &descriptor, OCI_DTYPE_TIMESTAMP, 0, nullptr);
+        OCIStmtPrepare(other->stmt, other->err, World::Text("select 1 from dual"), 18, OCI_NTV_SYNTAX, OCI_DEFAULT);
+        EXPECT_EQ(OCIStmtExecute(other->svc, other->stmt, other->err, 0, 0, nullptr, nullptr, OCI_DEFAULT),
+                  OCI_SUCCESS);
     }).join();
     w.SURELY(OCIDescriptorFree, descriptor, OCI_DTYPE_TIMESTAMP);
-    w.Surely("OCIHandleFree of a statement", [&] { return OCIHandleFree(stmt, OCI_HTYPE_STMT); });
-    w.SURELY(OCILogoff, svc, static_cast<OCIError*>(err));
-    w.Surely("OCIHandleFree of the environment", [&] { return OCIHandleFree(env, OCI_HTYPE_ENV); });
+    w.SURELY(OCIHandleFree, other->stmt, OCI_HTYPE_STMT);
+    w.SURELY(OCILogoff, std::exchange(other->svc, nullptr), other->err);
+    w.SURELY(OCIHandleFree, std::exchange(other->env, nullptr), OCI_HTYPE_ENV);
     w.See("freed");
 }
 
-void HandlesAndDescriptors(World& w) {
+SCENARIO(HandlesAndDescriptors, environment, nullptr, "made;") {
     for (ub4 type = OCI_HTYPE_ERROR; type <= 29; ++type)
         if (type != OCI_HTYPE_BIND && type != OCI_HTYPE_DEFINE) w.New<dvoid>(type);
     for (const ub4 type : {OCI_DTYPE_LOB, OCI_DTYPE_ROWID, OCI_DTYPE_RSET, OCI_DTYPE_TIMESTAMP_TZ})
         w.NewDescriptor<dvoid>(type);
     static dvoid* array[5];
-    w.Step("OCIArrayDescriptorAlloc", [&] {
-        return OCIArrayDescriptorAlloc(w.env, array, OCI_DTYPE_DATE, 5, 8, nullptr);
-    }, Told::environment);
+    w.STEP_TOLD(Told::environment, OCIArrayDescriptorAlloc, w.env, array, OCI_DTYPE_DATE, 5, 8, nullptr);
     w.AtEnd([] { return OCIArrayDescriptorFree(array, OCI_DTYPE_DATE); });
     w.See("made");
 }
 
 // A server, a session and a context put together by hand, in UTF-16.
-void AttachAndBegin(World& w) {
+SCENARIO(AttachAndBegin, environment, nullptr, "36;version;", OCI_UTF16) {
     auto* server = w.New<OCIServer>(OCI_HTYPE_SERVER);
     auto* session = w.New<OCISession>(OCI_HTYPE_SESSION);
     auto* svc = w.New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    w.Step("OCIServerAttach", [&] {
-        const auto* name = reinterpret_cast<const OraText*>(u":memory:");
-        return OCIServerAttach(server, w.err, name, 16, OCI_DEFAULT);
-    });
+    w.STEP(OCIServerAttach, server, w.err, reinterpret_cast<const OraText*>(u":memory:"), 16, OCI_DEFAULT);
     w.AtEnd([&w, server] { return OCIServerDetach(server, w.err, OCI_DEFAULT); });
     const struct { dvoid* on; ub4 type; dvoid* value; ub4 size; ub4 attribute; } set[] = {
         {svc, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER},
@@ -130,103 +116,60 @@ void AttachAndBegin(World& w) {
     w.See(version[0] != 0 ? "version" : "");
 }
 
-// The owner's account is made before, so that a failed logon or change is seen by the next.
-void Account(World& w) {
-    const std::string database = w.Folder() + "/accounts.db";
-    OCISvcCtx* svc = nullptr;
-    EXPECT_EQ(OCILogon(w.env, w.err, &svc, World::Text("ann"), 3, World::Text("one"), 3, World::Text(database),
-                       World::Size(database)), OCI_SUCCESS);
-    EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS);
-}
-
-// Who owns the file is let in.
-void SystemUser(World& w) {
-    LogOn(w, "", "", w.Folder() + "/accounts.db");
-    w.See("in");
-}
-
-void PasswordChange(World& w) {
-    const std::string database = w.Folder() + "/accounts.db";
+// The first logon by name makes the database and its owner's account: both, or neither. Then the password is another.
+SCENARIO(FirstLogon, environment, nullptr, "1017;") {
+    const std::string database = w.Folder() + "/new.db";
+    w.AtEnd([database] { return std::filesystem::remove(database), OCI_SUCCESS; });
+    LogOn(w, "ann", "one", database);
     const auto change = [&w](const char* from, const char* to) {
         return OCIPasswordChange(w.svc, w.err, World::Text("ann"), 3, World::Text(from), 3, World::Text(to), 3,
                                  OCI_DEFAULT);
     };
-    LogOn(w, "ann", "one", database);
     Attempt([&] { w.Step("OCIPasswordChange", [&] { return change("one", "two"); }); },
             [&] { EXPECT_EQ(change("one", "one"), OCI_SUCCESS) << "it is still the old one"; });
-    EXPECT_EQ(change("two", "one"), OCI_SUCCESS) << "it is the new one";
-    w.See("changed");
-}
-
-// The first logon by name makes the database and its owner's account: both, or neither.
-void FirstLogon(World& w) {
-    const std::string database = w.Folder() + "/new.db";
-    w.AtEnd([database] { return std::filesystem::remove(database), OCI_SUCCESS; });
-    LogOn(w, "ann", "one", database);
+    LogOn(w, "ann", "two", database);
     OCISvcCtx* other = nullptr;
-    EXPECT_EQ(OCILogon(w.env, w.err, &other, World::Text("ann"), 3, World::Text("two"), 3, World::Text(database),
+    EXPECT_EQ(OCILogon(w.env, w.err, &other, World::Text("ann"), 3, World::Text("one"), 3, World::Text(database),
                        World::Size(database)), OCI_ERROR);
     w.See(w.Number(w.err, OCI_HTYPE_ERROR));
 }
 
-void MustRun(World& w, OCISvcCtx* svc, OCIStmt* stmt, std::string_view sql) {
-    EXPECT_EQ(OCIStmtPrepare(stmt, w.err, World::Text(sql), World::Size(sql), OCI_NTV_SYNTAX, OCI_DEFAULT),
-              OCI_SUCCESS);
-    EXPECT_EQ(OCIStmtExecute(svc, stmt, w.err, 1, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS) << sql;
-}
-
 // The end of a session commits what is open, queries or not.
-void LogoffCommits(World& w) {
+SCENARIO(LogoffCommits, session, nullptr, "1;") {
     const std::string database = w.Folder() + "/logoff.db";
+    const Instead of_the_worlds(w.svc, {});
     const auto log_on = [&] {
-        OCISvcCtx* svc = nullptr;
-        EXPECT_EQ(OCILogon(w.env, w.err, &svc, nullptr, 0, nullptr, 0, World::Text(database), World::Size(database)),
+        EXPECT_EQ(OCILogon(w.env, w.err, &w.svc, nullptr, 0, nullptr, 0, World::Text(database), World::Size(database)),
                   OCI_SUCCESS);
-        return svc;
     };
-    dvoid *changing = nullptr, *reading = nullptr;
-    OCIHandleAlloc(w.env, &changing, OCI_HTYPE_STMT, 0, nullptr);
-    OCIHandleAlloc(w.env, &reading, OCI_HTYPE_STMT, 0, nullptr);
-    w.AtEnd([changing] { return OCIHandleFree(changing, OCI_HTYPE_STMT); });
-    w.AtEnd([reading] { return OCIHandleFree(reading, OCI_HTYPE_STMT); });
-    auto* const change = static_cast<OCIStmt*>(changing);
-    OCISvcCtx* svc = log_on();
-    MustRun(w, svc, change, "create table if not exists t(a number)");
-    MustRun(w, svc, change, "delete from t");
-    MustRun(w, svc, change, "commit");
-    MustRun(w, svc, change, "insert into t values(1)");
-    sb4 number = 0;
-    OCIDefine* define = nullptr;
-    auto* const query = static_cast<OCIStmt*>(reading);
-    OCIStmtPrepare(query, w.err, World::Text("select a from t"), 15, OCI_NTV_SYNTAX, OCI_DEFAULT);
-    OCIDefineByPos(query, &define, w.err, 1, &number, 4, SQLT_INT, nullptr, nullptr, nullptr, OCI_DEFAULT);
-    EXPECT_EQ(OCIStmtExecute(svc, query, w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
-    bool failed = false;
-    try {
-        w.STEP(OCILogoff, svc, w.err);
-    } catch (const Stopped&) {
-        failed = true;
-        EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS) << "again";
-    }
-    svc = log_on();
-    MustRun(w, svc, change, "delete from t");
-    ub4 rows = 0;
-    OCIAttrGet(change, OCI_HTYPE_STMT, &rows, nullptr, OCI_ATTR_ROW_COUNT, w.err);
-    EXPECT_EQ(OCILogoff(svc, w.err), OCI_SUCCESS);
-    EXPECT_EQ(rows, 1u) << (failed ? "after a logoff that failed" : "after a logoff");
-    if (failed) throw Stopped();
-    w.See(static_cast<long>(rows));
+    const auto rows_kept = [&] {
+        log_on();
+        const std::string rows = w.One("select count(*) from t");
+        EXPECT_EQ(OCILogoff(w.svc, w.err), OCI_SUCCESS);
+        EXPECT_EQ(rows, "1") << (Seen().failed ? "after a logoff that failed" : "after a logoff");
+        return rows;
+    };
+    log_on();
+    w.Sql("create table if not exists t(a number)");
+    w.Sql("delete from t");
+    w.Sql("commit");
+    w.Sql("insert into t values(1)");
+    OCIStmtPrepare(w.stmt, w.err, World::Text("select a from t"), 15, OCI_NTV_SYNTAX, OCI_DEFAULT);
+    EXPECT_EQ(OCIStmtExecute(w.svc, w.stmt, w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT), OCI_SUCCESS);
+    Attempt([&] { w.STEP(OCILogoff, w.svc, w.err); }, [&] {
+        EXPECT_EQ(OCILogoff(w.svc, w.err), OCI_SUCCESS) << "again";
+        rows_kept();
+    });
+    w.See(rows_kept());
 }
 
 // What is told of an error takes memory, too; without it there is the return code, and the record stays.
-void ErrorTexts(World& w) {
+SCENARIO(ErrorTexts, session, nullptr, "942;named;") {
     OCIStmtPrepare(w.stmt, w.err, World::Text("select * from missing"), 21, OCI_NTV_SYNTAX, OCI_DEFAULT);
     OCIStmtExecute(w.svc, w.stmt, w.err, 0, 0, nullptr, nullptr, OCI_DEFAULT);
     OraText words[1024] = "";
     sb4 number = 0;
-    const auto get = [&] {
-        return OCIErrorGet(w.err, 1, nullptr, &number, words, sizeof words, OCI_HTYPE_ERROR);
-    };
+    const auto get = [&] { return OCIErrorGet(w.err, 1, nullptr, &number, words, sizeof words, OCI_HTYPE_ERROR); };
     const auto armed = [&] {
         const Armed memory;
         return get();
@@ -237,16 +180,14 @@ void ErrorTexts(World& w) {
 }
 
 // An error with words of its own: without memory for them there is a record all the same, and one only.
-void ErrorsWithWords(World& w) {
+SCENARIO(ErrorsWithWords, environment, nullptr, "30152;named;") {
     EXPECT_EQ(OCIFileInit(w.env, w.err), OCI_SUCCESS);
     w.AtEnd([&w] { return OCIFileTerm(w.env, w.err); });
     constexpr char kName[] = "/no/such/folder/and/a/name/that/is/longer/than/a/short/string";
     OCIFileObject* file = nullptr;
     try {
-        w.Step("OCIFileOpen", [&] {
-            return OCIFileOpen(w.env, w.err, &file, World::Text(kName), nullptr, OCI_FILE_READ_ONLY, OCI_FILE_EXIST,
-                               OCI_FILE_BIN);
-        }, Told::error_handle, 30152);
+        w.STEP_OR(30152, OCIFileOpen, w.env, w.err, &file, World::Text(kName), nullptr, OCI_FILE_READ_ONLY,
+                  OCI_FILE_EXIST, OCI_FILE_BIN);
     } catch (const Stopped&) {
         EXPECT_EQ(OCIErrorGet(w.err, 2, nullptr, nullptr, nullptr, 0, OCI_HTYPE_ERROR), OCI_NO_DATA);
         if (Seen().failed) throw;
@@ -257,12 +198,12 @@ void ErrorsWithWords(World& w) {
 }
 
 // Pools lose no session, whatever fails: those that were got are given back at the end, and then none is in use.
-void PoolSessions(World& w) {
+SCENARIO(PoolSessions, environment, nullptr, "1;") {
     auto* pool = w.New<OCISPool>(OCI_HTYPE_SPOOL);
-    static std::vector<OCISvcCtx*> held;
+    auto& held = w.Kept<std::vector<OCISvcCtx*>>();
     OraText* name = nullptr;
     ub4 length = 0;
-    w.AtEnd([&w, pool] {
+    w.AtEnd([&w, &held, pool] {
         for (; !held.empty(); held.pop_back()) OCISessionRelease(held.back(), w.err, nullptr, 0, OCI_DEFAULT);
         ub4 busy = 9;
         EXPECT_EQ(OCIAttrGet(pool, OCI_HTYPE_SPOOL, &busy, nullptr, OCI_ATTR_SPOOL_BUSY_COUNT, w.err), OCI_SUCCESS);
@@ -289,7 +230,7 @@ void PoolSessions(World& w) {
 }
 
 // A branch that is left, taken up, prepared and committed. Whatever fails, what is left of it can be rolled back.
-void Branches(World& w) {
+SCENARIO(Branches, environment, nullptr, "2;") {
     LogOn(w, "", "", w.Folder() + "/branches.db");
     w.stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
     w.Run("create table if not exists b(n number)");
@@ -315,25 +256,5 @@ void Branches(World& w) {
     w.STEP(OCITransRollback, w.svc, w.err, OCI_DEFAULT);
 }
 
-constexpr Scenario kScenarios[] = {
-    {"Branches", Ground::environment, nullptr, Branches, "2;"},
-    {"FromNothing", Ground::nothing, nullptr, FromNothing, "abc;", OCI_DEFAULT, true},
-    {"FromNothingThreaded", Ground::nothing, nullptr, FromNothing, "abc;", OCI_THREADED | OCI_OBJECT},
-    {"InitializeAndLogOn2", Ground::nothing, nullptr, InitializeAndLogOn2, "20;"},
-    {"FreeingTakesNoMemory", Ground::nothing, nullptr, FreeingTakesNoMemory, "freed;", OCI_DEFAULT, true},
-    {"HandlesAndDescriptors", Ground::environment, nullptr, HandlesAndDescriptors, "made;"},
-    {"AttachAndBegin", Ground::environment, nullptr, AttachAndBegin, "36;version;", OCI_UTF16},
-    {"FirstLogon", Ground::environment, nullptr, FirstLogon, "1017;"},
-    {"SystemUser", Ground::environment, Account, SystemUser, "in;"},
-    {"PasswordChange", Ground::environment, Account, PasswordChange, "changed;"},
-    {"LogoffCommits", Ground::environment, nullptr, LogoffCommits, "1;"},
-    {"PoolSessions", Ground::environment, nullptr, PoolSessions, "1;"},
-    {"ErrorsWithWords", Ground::environment, nullptr, ErrorsWithWords, "30152;named;"},
-    {"ErrorTexts", Ground::session, nullptr, ErrorTexts, "942;named;"},
-};
-
 }  // namespace
-
-std::span<const Scenario> HandleScenarios() { return kScenarios; }
-
 }  // namespace faults

@@ -1,5 +1,5 @@
 // Large objects: temporary ones, those of columns, pieces, copies, buffering.
-#include "faults/scenarios.h"
+#include "faults/world.h"
 
 namespace faults {
 namespace {
@@ -49,7 +49,7 @@ void SeeLob(World& w, OCILobLocator* lob) {
 }
 
 // Grows in memory, then in a file, with a gap.
-void TemporaryGrows(World& w) {
+SCENARIO(LobTemporaryGrows, session, nullptr, "5;h\xC3\xA4lf;141000;4;h  x;") {
     const std::string much(kLong, 'x');
     OCILobLocator* const lob = Temporary(w);
     Write(w, lob, 1, "h\xC3\xA4lf");
@@ -82,10 +82,10 @@ void WriteColumn(World& w, const char* query, ub2 type, ub4 offset, std::string_
     w.STEP(OCITransCommit, w.svc, w.err, OCI_DEFAULT);
 }
 
-void ColumnInPlace(World& w) {
+SCENARIO(LobColumnInPlace, session, TableOfLobs, "5;\x01" "ab\x04\x05;") {
     WriteColumn(w, "select b from l for update", SQLT_BLOB, 2, "ab", kBytes, "0161620405", "0102030405");
 }
-void ColumnGrows(World& w) {
+SCENARIO(LobColumnGrows, session, TableOfLobs, "70040;") {
     WriteColumn(w, "select c from l for update", SQLT_CLOB, 40, std::string(kLong, 'y'), kWidth, "70039", "43");
 }
 
@@ -94,7 +94,7 @@ void TableOfObjects(World& w) {
     if (w.OnServer()) w.Sql("create domain lo as oid");
     w.Sql(w.OnServer() ? "create table o(b lo, c blob)" : "create table o(b blob, c blob)");
 }
-void Objects(World& w) {
+SCENARIO(LobObjects, session, TableOfObjects, "20;some words and more ;") {
     w.Run("insert into o values(empty_blob(), x'00')");
     char bytes[] = "some bytes";
     w.Prepare("update o set b = :1");
@@ -106,7 +106,7 @@ void Objects(World& w) {
     SeeLob(w, lob);
 }
 
-void Copies(World& w) {
+SCENARIO(LobCopies, session, TableOfLobs, "24;  value of s  value of s;24;zzvalue of s  value of s;") {
     OCILobLocator* const from = Select(w, "select c from l");
     OCILobLocator* const to = Temporary(w);
     OCILobLocator* other = NewLocator(w);
@@ -118,7 +118,7 @@ void Copies(World& w) {
     SeeLob(w, other);
 }
 
-void Buffered(World& w) {
+SCENARIO(LobBuffered, session, TableOfLobs, "44;One and much more twoh that is h\xC3\xA4lf as long;") {
     OCILobLocator* const lob = Select(w, "select c from l for update");
     w.STEP(OCILobEnableBuffering, w.svc, w.err, lob);
     Write(w, lob, 1, "one and much more ");
@@ -132,7 +132,7 @@ void Buffered(World& w) {
 }
 
 // Polled, of UTF-16.
-void LobPieces(World& w) {
+SCENARIO(LobPieces, session, nullptr, "3;") {
     OCILobLocator* const lob = Temporary(w);
     ub4 amount = 0;
     for (const ub1 piece : {OCI_FIRST_PIECE, OCI_NEXT_PIECE, OCI_LAST_PIECE}) {
@@ -148,18 +148,5 @@ void LobPieces(World& w) {
     w.See(pieces);
 }
 
-constexpr Scenario kScenarios[] = {
-    {"LobTemporaryGrows", Ground::session, nullptr, TemporaryGrows, "5;h\xC3\xA4lf;141000;4;h  x;"},
-    {"LobColumnInPlace", Ground::session, TableOfLobs, ColumnInPlace, "5;\x01" "ab\x04\x05;"},
-    {"LobColumnGrows", Ground::session, TableOfLobs, ColumnGrows, "70040;"},
-    {"LobObjects", Ground::session, TableOfObjects, Objects, "20;some words and more ;"},
-    {"LobCopies", Ground::session, TableOfLobs, Copies, "24;  value of s  value of s;24;zzvalue of s  value of s;"},
-    {"LobBuffered", Ground::session, TableOfLobs, Buffered, "44;One and much more twoh that is h\xC3\xA4lf as long;"},
-    {"LobPieces", Ground::session, nullptr, LobPieces, "3;"},
-};
-
 }  // namespace
-
-std::span<const Scenario> LobScenarios() { return kScenarios; }
-
 }  // namespace faults

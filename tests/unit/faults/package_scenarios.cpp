@@ -6,14 +6,16 @@
 #include <fstream>
 #include <thread>
 
-#include "faults/scenarios.h"
+#include "faults/world.h"
 
 namespace faults {
 namespace {
 
 // ---- Dates
 
-void Dates(World& w) {
+SCENARIO(Dates, environment, nullptr,
+         "2024;Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED "
+         "SIXTY-SIX, 11:12:13 AM;") {
     OCIDate date{};
     w.STEP(OCIDateFromText, w.err, World::Text("Friday 29 FEBRUARY 2008 11:12:13"), 32,
            World::Text("DAY DD MONTH YYYY HH24:MI:SS"), 28, nullptr, 0, &date);
@@ -56,7 +58,7 @@ void SeeHour(World& w, OCIDateTime* of) {
     w.See(hour);
 }
 
-void Datetimes(World& w) {
+SCENARIO(Datetimes, environment, FindRegions, "-1;13;") {
     auto* there = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     auto* here = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     static std::size_t next = 0;
@@ -72,7 +74,7 @@ void Datetimes(World& w) {
 }
 
 // Sets have their tables for the life of the process: each run takes one that none has asked for yet, while any is left.
-void CharacterSets(World& w) {
+SCENARIO(CharacterSets, environment, nullptr, "ab;ab;") {
     constexpr sb4 kUnknownSet = 24329;    // what the system answers for a table that it has no memory for
     static std::size_t next = 0;
     constexpr ub2 kSets[] = {31, 32, 46, 170, 171, 178};
@@ -81,14 +83,13 @@ void CharacterSets(World& w) {
     size_t length = 0;
     const struct { ub2 to, from; } ways[] = {{set, 873}, {873, set}};
     for (const auto& way : ways) {
-        w.Step("OCINlsCharSetConvert", [&] {
-            return OCINlsCharSetConvert(w.env, w.err, way.to, text, sizeof text, way.from, "ab", 2, &length);
-        }, Told::error_handle, kUnknownSet);
+        w.STEP_OR(kUnknownSet, OCINlsCharSetConvert, w.env, w.err, way.to, text, sizeof text, way.from, "ab", 2,
+                  &length);
         w.See({text, length});
     }
 }
 
-void Intervals(World& w) {
+SCENARIO(Intervals, environment, nullptr, "14-JUL-24 11.11.10.500000005 AM;") {
     auto* moment = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
     auto* days = w.NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     w.STEP(OCIIntervalFromText, w.env, w.err, World::Text("-1 2:3:4.5"), 10, days);
@@ -100,8 +101,10 @@ void Intervals(World& w) {
     w.See({reinterpret_cast<char*>(text), size});
 }
 
+void InStJohns(World&) { setenv("TZ", ":America/St_Johns", 1); }
+
 // The zone of the process, which is read once.
-void ZoneOfTheProcess(World& w) {
+SCENARIO(ZoneOfTheProcess, environment, InStJohns, "1;13;", OCI_DEFAULT, true) {
     auto* zoned = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     auto* plain = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP);
     auto* local = w.NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_LTZ);
@@ -116,12 +119,9 @@ void ZoneOfTheProcess(World& w) {
     w.STEP(OCIDateTimeAssign, w.env, w.err, plain, zoned);
     SeeHour(w, zoned);
 }
-
-void InStJohns(World&) { setenv("TZ", ":America/St_Johns", 1); }
-
 // ---- Strings and raws
 
-void Strings(World& w) {
+SCENARIO(Strings, environment, nullptr, "a text that is too long for the room of the first;") {
     OCIString *&string = NewString(w), *&copy = NewString(w);
     const auto contents = [&](OCIString* one) {
         return std::string_view(reinterpret_cast<char*>(OCIStringPtr(w.env, one)), OCIStringSize(w.env, one));
@@ -138,13 +138,14 @@ void Strings(World& w) {
     w.See(contents(copy));
 }
 
-void Raws(World& w) {
-    static OCIRaw *raw, *copy;
-    raw = copy = nullptr;
-    w.AtEnd([&w] {
-        const sword code = copy ? OCIRawResize(w.env, w.err, 0, &copy) : OCI_SUCCESS;
-        return raw ? OCIRawResize(w.env, w.err, 0, &raw) : code;
-    });
+OCIRaw*& NewRaw(World& w) {
+    OCIRaw*& raw = w.Kept<OCIRaw*>();
+    w.AtEnd([&] { return raw ? OCIRawResize(w.env, w.err, 0, &raw) : OCI_SUCCESS; });
+    return raw;
+}
+
+SCENARIO(Raws, environment, nullptr, "100;") {
+    OCIRaw *&raw = NewRaw(w), *&copy = NewRaw(w);
     const ub1 bytes[100] = {1, 2, 3};
     w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 3, &raw);
     Attempt([&] {
@@ -157,16 +158,15 @@ void Raws(World& w) {
 
 // ---- Files and threads
 
-void Files(World& w) {
-    const std::string folder = w.Folder();
+SCENARIO(Files, environment, nullptr, "20000;10;20001;") {
+    OraText *name = World::Text("a file with a long name"), *folder = World::Text(w.Folder());
     w.STEP(OCIFileInit, w.env, w.err);
     w.AtEnd([&w] { return OCIFileTerm(w.env, w.err); });
-    const std::string path = folder + "/a file with a long name";
+    const std::string path = w.Folder() + "/a file with a long name";
     std::ofstream(path) << "what was there";
     OCIFileObject* file = nullptr;
     const auto open = [&](ub4 create) {
-        w.STEP(OCIFileOpen, w.env, w.err, &file, World::Text("a file with a long name"), World::Text(folder),
-               OCI_FILE_READ_WRITE, create, OCI_FILE_BIN);
+        w.STEP(OCIFileOpen, w.env, w.err, &file, name, folder, OCI_FILE_READ_WRITE, create, OCI_FILE_BIN);
         w.AtEnd([&w, file] { return OCIFileClose(w.env, w.err, file); });
     };
     Attempt([&] { open(OCI_FILE_TRUNCATE); },
@@ -185,44 +185,39 @@ void Files(World& w) {
     w.See(count);
     ubig_ora length = 0;
     ub1 there = 0;
-    w.STEP(OCIFileGetLength, w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &length);
-    w.STEP(OCIFileExists, w.env, w.err, World::Text("a file with a long name"), World::Text(folder), &there);
+    w.STEP(OCIFileGetLength, w.env, w.err, name, folder, &length);
+    w.STEP(OCIFileExists, w.env, w.err, name, folder, &there);
     w.See(static_cast<long>(length) + there);
 }
 
-void Threads(World& w) {
-    static OCIThreadMutex* mutex;
-    static OCIThreadKey* key;
-    static OCIThreadId* id;
-    static OCIThreadHandle* handle;
-    w.Surely("OCIThreadProcessInit", [] {
-        OCIThreadProcessInit();
-        return OCI_SUCCESS;
-    });
+SCENARIO(Threads, environment, nullptr, "1;1;") {
+    auto& mutex = w.Kept<OCIThreadMutex*>();
+    auto& key = w.Kept<OCIThreadKey*>();
+    auto& id = w.Kept<OCIThreadId*>();
+    auto& handle = w.Kept<OCIThreadHandle*>();
+    auto& ran = w.Kept(0);
+    w.Surely("OCIThreadProcessInit", [] { return OCIThreadProcessInit(), OCI_SUCCESS; });
     w.STEP(OCIThreadInit, w.env, w.err);
     w.AtEnd([&w] { return OCIThreadTerm(w.env, w.err); });
     w.STEP(OCIThreadMutexInit, w.env, w.err, &mutex);
-    w.AtEnd([&w] { return OCIThreadMutexDestroy(w.env, w.err, &mutex); });
+    w.AtEnd([&] { return OCIThreadMutexDestroy(w.env, w.err, &mutex); });
     w.STEP(OCIThreadMutexAcquire, w.env, w.err, mutex);
     w.SURELY(OCIThreadMutexRelease, w.env, w.err, mutex);
     w.STEP(OCIThreadKeyInit, w.env, w.err, &key, nullptr);
-    w.AtEnd([&w] { return OCIThreadKeyDestroy(w.env, w.err, &key); });
+    w.AtEnd([&] { return OCIThreadKeyDestroy(w.env, w.err, &key); });
     w.STEP(OCIThreadKeySet, w.env, w.err, key, &w);
     dvoid* value = nullptr;
     w.STEP(OCIThreadKeyGet, w.env, w.err, key, &value);
     w.See(value == &w);
     w.STEP(OCIThreadIdInit, w.env, w.err, &id);
-    w.AtEnd([&w] { return OCIThreadIdDestroy(w.env, w.err, &id); });
+    w.AtEnd([&] { return OCIThreadIdDestroy(w.env, w.err, &id); });
     w.STEP(OCIThreadIdGet, w.env, w.err, id);
     w.STEP(OCIThreadHndInit, w.env, w.err, &handle);
-    w.AtEnd([&w] { return OCIThreadHndDestroy(w.env, w.err, &handle); });
-    static int ran;
-    ran = 0;
+    w.AtEnd([&] { return OCIThreadHndDestroy(w.env, w.err, &handle); });
     // The system does not say whether it was memory or the number of threads: 21500 for both.
     Attempt([&] {
-        w.Step("OCIThreadCreate", [&] {
-            return OCIThreadCreate(w.env, w.err, [](dvoid* count) { ++*static_cast<int*>(count); }, &ran, id, handle);
-        }, Told::error_handle, 21500);
+        w.STEP_OR(21500, OCIThreadCreate, w.env, w.err, [](dvoid* count) { ++*static_cast<int*>(count); }, &ran, id,
+                  handle);
     }, [&] { EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_ERROR) << "there is no thread"; });
     Attempt([&] { w.STEP(OCIThreadJoin, w.env, w.err, handle); }, [&] {
         EXPECT_EQ(OCIThreadJoin(w.env, w.err, handle), OCI_SUCCESS) << "asked again";
@@ -233,7 +228,7 @@ void Threads(World& w) {
 }
 
 // Many at once: those that find no memory for what a thread keeps look handles up and free them as others do.
-void ThreadsWithoutMemory(World& w) {
+SCENARIO(ThreadsWithoutMemory, environment, nullptr, "0;", OCI_THREADED) {
     constexpr int kThreads = 4, kHandles = 100;
     auto* const stmt = w.New<OCIStmt>(OCI_HTYPE_STMT);
     std::vector<std::vector<dvoid*>> handles(kThreads, std::vector<dvoid*>(kHandles));
@@ -258,23 +253,5 @@ void ThreadsWithoutMemory(World& w) {
     w.See(wrong);
 }
 
-constexpr Scenario kScenarios[] = {
-    {"Dates", Ground::environment, nullptr, Dates,
-     "2024;Mardi, 3RD of the month of Février 2009, TWO MILLION FOUR HUNDRED FIFTY-FOUR THOUSAND EIGHT HUNDRED "
-     "SIXTY-SIX, 11:12:13 AM;"},
-    {"Datetimes", Ground::environment, FindRegions, Datetimes, "-1;13;"},
-    {"ZoneOfTheProcess", Ground::environment, InStJohns, ZoneOfTheProcess, "1;13;", OCI_DEFAULT, true},
-    {"CharacterSets", Ground::environment, nullptr, CharacterSets, "ab;ab;"},
-    {"Intervals", Ground::environment, nullptr, Intervals, "14-JUL-24 11.11.10.500000005 AM;"},
-    {"Strings", Ground::environment, nullptr, Strings, "a text that is too long for the room of the first;"},
-    {"Raws", Ground::environment, nullptr, Raws, "100;"},
-    {"Files", Ground::environment, nullptr, Files, "20000;10;20001;"},
-    {"ThreadsWithoutMemory", Ground::environment, nullptr, ThreadsWithoutMemory, "0;", OCI_THREADED},
-    {"Threads", Ground::environment, nullptr, Threads, "1;1;"},
-};
-
 }  // namespace
-
-std::span<const Scenario> PackageScenarios() { return kScenarios; }
-
 }  // namespace faults

@@ -1,5 +1,5 @@
 // Changes, transactions, definitions, blocks, the statement cache, and what is told of statements.
-#include "faults/scenarios.h"
+#include "faults/world.h"
 
 namespace faults {
 namespace {
@@ -7,6 +7,7 @@ namespace {
 void Table(World& w) {
     w.Sql("create table t(a number primary key, b varchar2(100), d date, c char(8))");
     w.Sql("create table log(a number)");
+    w.Sql("create table spans(ym interval year to month, v varchar2(20))");
     w.Sql("create trigger written after insert on t begin insert into log values(new.a); end");
     w.Sql("create trigger gone after delete on t begin delete from log where a = old.a; end");
     w.Sql("create table many(a number, b date, c varchar2(40), d timestamp, e clob, f number)");
@@ -30,6 +31,15 @@ ub4 QuietAttribute(World& w, ub4 attribute) {
     ub4 value = 99;
     EXPECT_EQ(OCIAttrGet(w.stmt, OCI_HTYPE_STMT, &value, nullptr, attribute, w.err), OCI_SUCCESS);
     return value;
+}
+
+// What is executed one after the other, and what the query answers from then on, a transaction rolled back or not.
+struct Change { const char *sql, *kept, *rolled_back = "0"; };
+void RunAll(World& w, const char* query, std::initializer_list<Change> changes) {
+    for (const Change& change : changes) {
+        w.Run(change.sql);
+        w.Keeps(query, change.kept, change.rolled_back);
+    }
 }
 
 // An array that fails on its way keeps the rows before, and says how many they are.
@@ -65,18 +75,9 @@ struct Numbers {
     }
 };
 
-void ArrayInsert(World& w) {
+SCENARIO(ArrayOfStructures, session, Table, "earlier;a text too long for a short string;two;-;") {
     EarlierRow(w);
-    Numbers rows;
-    w.Prepare("insert into t(a, b) values(:1, :2)");
-    rows.Bind(w);
-    ExecuteArray(w, 5);
-    w.See(w.Attribute<ub4>(OCI_ATTR_ROW_COUNT));
-    w.See(Rows(w));
-}
-
-void ArrayOfStructures(World& w) {
-    EarlierRow(w);
+    w.CommitAtEnd("delete from t");
     struct Row {
         sb8 number;
         char text[40];
@@ -86,7 +87,8 @@ void ArrayOfStructures(World& w) {
     OCIBind* const binds[] = {w.Bind(1, {&rows[0].number, 8, SQLT_INT}),
                               w.Bind(2, {rows[0].text, 40, SQLT_STR, &rows[0].indicator})};
     for (OCIBind* bind : binds) w.STEP(OCIBindArrayOfStruct, bind, w.err, sizeof(Row), sizeof(Row), 0, 0);
-    ExecuteArray(w, 3);
+    ExecuteArray(w, 3, OCI_COMMIT_ON_SUCCESS);
+    w.Sql("rollback");
     w.Prepare("select a, b from t order by a");
     OCIDefine* const defines[] = {w.Define(1, {&back[0].number, 8, SQLT_INT}),
                                   w.Define(2, {back[0].text, 40, SQLT_STR, &back[0].indicator})};
@@ -97,7 +99,7 @@ void ArrayOfStructures(World& w) {
 
 // Rows 1 and 3 are refused: each gets a record of its own. So does one that finds no memory; where none is left for
 // records, the call fails. Every row is accounted for.
-void BatchErrors(World& w) {
+SCENARIO(BatchErrors, session, Table, "2;1;1;1;3;0earlier,10aa,30-,50ee;") {
     EarlierRow(w);
     Numbers rows;
     rows.numbers[1] = rows.numbers[3] = 10;
@@ -124,7 +126,8 @@ void BatchErrors(World& w) {
 }
 
 // Values of the packages and of descriptors, and a long one, as binds.
-void ManyTypesIn(World& w) {
+SCENARIO(ManyTypesIn, session, Table,
+         "7 2024-02-29 01:02:03 a string of the package 2024-07-15 13:14:15 70000 2.25;") {
     EarlierRow(w);
     OCINumber number{};
     const sb4 seven = 7;
@@ -147,7 +150,8 @@ void ManyTypesIn(World& w) {
     w.See(w.One("select a || ' ' || b || ' ' || c || ' ' || d || ' ' || length(e) || ' ' || f from many"));
 }
 
-void Returning(World& w) {
+SCENARIO(Returning, session, Table,
+         "naa;na text too long for a short string;;0earlier,10naa,20na text too long for a short string,30-;") {
     EarlierRow(w);
     Numbers rows;
     char texts[5][60] = {};
@@ -162,7 +166,7 @@ void Returning(World& w) {
 }
 
 // Dates, fixed texts and functions of the dialect, in values and in conditions.
-void FunctionsAndComparisons(World& w) {
+SCENARIO(FunctionsAndComparisons, session, Table, "1;0earlier,1Ann01 MARCH     2024*** 1,234.50;") {
     EarlierRow(w);
     char day[] = "29-FEB-24";
     w.Prepare("insert into t(a, b, d, c) values(1, initcap('ann') || to_char(to_date('2024-03-01', 'YYYY-MM-DD'), "
@@ -170,72 +174,48 @@ void FunctionsAndComparisons(World& w) {
     w.Bind(1, {day, sizeof day, SQLT_STR});
     w.Execute();
     w.Keeps(kCount, "2");
-    w.Prepare("update t set b = b || lpad(to_char(1234.5, '9,999.99'), 12, '*') where d = '29-FEB-24' and c = 'ab'");
-    w.Execute();
+    w.Run("update t set b = b || lpad(to_char(1234.5, '9,999.99'), 12, '*') where d = '29-FEB-24' and c = 'ab'");
     w.See(w.Attribute<ub4>(OCI_ATTR_ROW_COUNT));
     w.See(Rows(w));
 }
 
 // Several rows changed, and given back, by one statement; then one from another table.
-void ChangesOfManyRows(World& w) {
+SCENARIO(ChangesOfManyRows, session, Table, "2;a longer text for also earlier;0a longer text for earlier;") {
+    constexpr const char* kQuery = "select count(*) || max(b) from t";
     w.Sql("insert into t(a, b) values(0, 'earlier')");
     w.Sql("insert into t(a, b) values(1, 'also earlier')");
-    w.Keeps("select count(*) || max(b) from t", "2earlier", "");
+    w.Keeps(kQuery, "2earlier", "");
     char texts[2][60] = {};
     ub4 count = 0;
     w.Prepare("begin update t set b = 'a longer text for ' || b returning b into :out; end;");
     w.BindName("out", {texts, 60, SQLT_STR}, 2, &count);
     w.Execute();
-    w.Keeps("select count(*) || max(b) from t", "2a longer text for earlier", "");
+    w.Keeps(kQuery, "2a longer text for earlier", "");
     w.See(count);
     w.See(texts[1]);
-    w.Run("insert into t(a, b) select a + 10, b from t");
-    w.Keeps("select count(*) || max(b) from t", "4a longer text for earlier", "");
-    w.Run("delete from t where a > 0");
-    w.Keeps("select count(*) || max(b) from t", "1a longer text for earlier", "");
+    RunAll(w, kQuery, {{"insert into t(a, b) select a + 10, b from t", "4a longer text for earlier", ""},
+                       {"delete from t where a > 0", "1a longer text for earlier", ""}});
     w.See(Rows(w));
-}
-
-void CommitsOnSuccess(World& w) {
-    EarlierRow(w);
-    w.CommitAtEnd("delete from t");
-    w.Prepare("insert into t(a, b) values(1, 'done')");
-    ExecuteArray(w, 1, OCI_COMMIT_ON_SUCCESS);
-    w.Sql("rollback");
-    w.See(Rows(w));
-}
-
-void Transactions(World& w) {
-    EarlierRow(w);
-    w.Run("savepoint s");
-    w.Run("insert into t(a) values(1)");
-    w.Keeps(kCount, "2");
-    w.Run("rollback to s");
-    w.Keeps(kCount, "1");
-    w.Run("commit");
-    w.Keeps(kCount, "1", "1");
-    w.CommitAtEnd("delete from t");
-    w.Sql("rollback");
-    w.See(w.One("select count(*) from t"));
-    w.Run("delete from t");
-    w.Keeps(kCount, "0", "1");
-    w.Run("rollback");
-    w.Keeps(kCount, "1", "1");
-    w.See(w.One("select count(*) from t"));
 }
 
 // A definition commits what came before it, when it is done.
-void Definition(World& w) {
+SCENARIO(Transactions, session, Table, "0earlier,2-;") {
     EarlierRow(w);
     w.CommitAtEnd("drop table if exists made", "delete from t");
-    w.Prepare("create table made(n number(5,2), d date default sysdate, v varchar2(20) not null)");
-    w.Execute();
-    w.See(w.One("select count(*) from made"));
-    w.Sql("rollback");
-    w.See(w.One("select count(*) from t"));
+    RunAll(w, kCount, {{"savepoint s", "1"},
+                       {"insert into t(a) values(1)", "2"},
+                       {"rollback to s", "1"},
+                       {"commit", "1", "1"},
+                       {"delete from t", "0", "1"},
+                       {"rollback", "1", "1"},
+                       {"insert into t(a) values(2)", "2", "1"},
+                       {"create table made(n number(5,2), d date default sysdate, v varchar2(20) not null)", "2", "2"},
+                       {"insert into made(n, v) values(1, 'x')", "2", "2"},
+                       {"rollback", "2", "2"}});
+    w.See(Rows(w));
 }
 
-void Block(World& w) {
+SCENARIO(Block, session, Table, "6;0earlier,1-,2-,3-;") {
     EarlierRow(w);
     sb4 numbers[3] = {1, 2, 3};
     ub4 count = 3;
@@ -251,47 +231,35 @@ void Block(World& w) {
     w.See(Rows(w));
 }
 
-void BlockWithCursor(World& w) {
-    sb4 x = 77;
-    static OCIStmt* cursor;
-    cursor = nullptr;
-    w.AtEnd([] { return cursor ? OCIHandleFree(cursor, OCI_HTYPE_STMT) : OCI_SUCCESS; });
-    w.Prepare("begin open :c for select 'a value that is not short at all', :x from dual; end;");
+// A cursor; and a result set, whose descriptor becomes a statement.
+SCENARIO(BlockWithCursors, session, nullptr, "a value that is not short at all;77;another value that is not short;") {
+    sb4 x = 77, number = 0;
+    char text[40] = "";
+    OCIStmt*& cursor = w.Kept<OCIStmt*>();
+    dvoid*& result = w.Kept<dvoid*>();
+    ub4& type = w.Kept<ub4>(OCI_DTYPE_RSET);
+    w.AtEnd([&cursor] { return cursor ? OCIHandleFree(cursor, OCI_HTYPE_STMT) : OCI_SUCCESS; });
+    w.STEP_TOLD(Told::environment, OCIDescriptorAlloc, w.env, &result, OCI_DTYPE_RSET, 0, nullptr);
+    w.AtEnd([&] { return type == OCI_DTYPE_RSET ? OCIDescriptorFree(result, type) : OCIHandleFree(result, type); });
+    w.Prepare("begin open :c for select 'a value that is not short at all', :x from dual; "
+              "open :r for select 'another value that is not short' from dual; end;");
     w.BindName("c", {&cursor, 8, SQLT_CUR});
     w.BindName("x", {&x, 4, SQLT_INT});
-    w.Execute();
-    const Instead of_block(w.stmt, cursor);
-    char text[40] = "";
-    sb4 number = 0;
-    w.Define(1, {text, 40, SQLT_STR});
-    w.Define(2, {&number, 4, SQLT_INT});
-    w.Fetch();
-    w.See(text);
-    w.See(number);
-}
-
-// The descriptor becomes a statement.
-void BlockWithResultSet(World& w) {
-    static dvoid* result;
-    static ub4 type;
-    result = nullptr;
-    type = OCI_DTYPE_RSET;
-    w.Step("OCIDescriptorAlloc", [&] { return OCIDescriptorAlloc(w.env, &result, OCI_DTYPE_RSET, 0, nullptr); },
-           Told::environment);
-    w.AtEnd([] { return type == OCI_DTYPE_RSET ? OCIDescriptorFree(result, type) : OCIHandleFree(result, type); });
-    w.Prepare("begin open :c for select 'a value that is not short at all' from dual; end;");
-    w.Bind(1, {&result, 8, SQLT_RSET});
+    w.BindName("r", {&result, 8, SQLT_RSET});
     w.Execute();
     w.STEP(OCIResultSetToStmt, static_cast<OCIResult*>(result), w.err);
     type = OCI_HTYPE_STMT;
-    const Instead of_block(w.stmt, static_cast<OCIStmt*>(result));
-    char text[40] = "";
-    w.Define(1, {text, 40, SQLT_STR});
-    w.Fetch();
-    w.See(text);
+    for (OCIStmt* opened : {cursor, static_cast<OCIStmt*>(result)}) {
+        const Instead of_block(w.stmt, opened);
+        w.Define(1, {text, 40, SQLT_STR});
+        if (opened == cursor) w.Define(2, {&number, 4, SQLT_INT});
+        w.Fetch();
+        w.See(text);
+        if (opened == cursor) w.See(number);
+    }
 }
 
-void IndexTables(World& w) {
+SCENARIO(IndexTables, session, Table, "5;number of the index table 5;") {
     sb4 numbers[5] = {1, 2, 3, 4, 5};
     char texts[5][40] = {};
     ub4 count = 5, texts_count = 0;
@@ -304,30 +272,16 @@ void IndexTables(World& w) {
 }
 
 // The second statement of the block is refused: the first is undone, memory or not.
-void BlockThatUndoesItself(World& w) {
+SCENARIO(BlockThatUndoesItself, session, Table, "0earlier;") {
     EarlierRow(w);
-    OCIStmtPrepare(w.stmt, w.err, World::Text("begin insert into t(a) values(1); insert into t(a) values(0); end;"), 66,
-                   OCI_NTV_SYNTAX, OCI_DEFAULT);
-    sword code;
-    {
-        const Armed armed;
-        code = OCIStmtExecute(w.svc, w.stmt, w.err, 1, 0, nullptr, nullptr, OCI_DEFAULT);
-    }
-    EXPECT_EQ(code, OCI_ERROR);
-    std::string text;
-    const sb4 number = World::Number(w.err, OCI_HTYPE_ERROR, &text);
-    EXPECT_TRUE(number == 1 || (number == 1019 && Seen().failed)) << number << " without " << Seen().first;
-    if (text.find(World::kRolledBack) != std::string::npos) {
-        w.Keeps(kCount, "0");
-        throw Stopped();
-    }
+    w.Prepare("begin insert into t(a) values(1); insert into t(a) values(0); end;");
+    EXPECT_THROW(w.STEP_OR(1, OCIStmtExecute, w.svc, w.stmt, w.err, 1, 0, nullptr, nullptr, OCI_DEFAULT), Stopped);
+    if (w.RolledBack()) throw Stopped();
     w.See(Rows(w));
 }
 
-void TableOfIntervals(World& w) { w.Sql("create table spans(ym interval year to month, v varchar2(20))"); }
-
 // Bound, defined, cast, as a text, and refused.
-void IntervalValues(World& w) {
+SCENARIO(IntervalValues, session, Table, "0;-01-02;") {
     auto* months = w.NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
     w.STEP(OCIIntervalFromText, w.env, w.err, World::Text("-1-2"), 4, months);
     w.Prepare("insert into spans values(:1, cast(:2 as interval year to month))");
@@ -346,7 +300,7 @@ void IntervalValues(World& w) {
     w.See(text);
 }
 
-void PiecesIn(World& w) {
+SCENARIO(PiecesIn, session, Table, "0earlier,1first and a longer one to follow it and last,2alone;") {
     EarlierRow(w);
     sb4 numbers[2] = {1, 2};
     w.Prepare("insert into t(a, b) values(:1, :2)");
@@ -358,12 +312,8 @@ void PiecesIn(World& w) {
     sword code = ExecuteArray(w, 2);
     for (const auto& step : steps) {
         EXPECT_EQ(code, OCI_NEED_DATA);
-        dvoid* handle = nullptr;
-        ub4 type = 0, iteration = 0, index = 0;
-        ub1 direction = 0, piece = 0;
-        w.STEP(OCIStmtGetPieceInfo, w.stmt, w.err, &handle, &type, &direction, &iteration, &index, &piece);
         ub4 length = World::Size(step.data);
-        w.STEP(OCIStmtSetPieceInfo, handle, type, w.err, step.data, &length, step.piece, nullptr, nullptr);
+        w.Piece(step.data, length, step.piece);
         Attempt([&] { code = ExecuteArray(w, 2); }, [&] {
             EXPECT_EQ(OCIStmtGetPieceInfo(w.stmt, w.err, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), OCI_ERROR)
                 << "an execute that failed waits for nothing";
@@ -403,27 +353,24 @@ struct DynamicPlaces {
     }
 };
 
-void DynamicData(World& w) {
+SCENARIO(DynamicData, session, Table,
+         "a value that is given in two piecesa value that is given in two piecesa value that is given in two pieces;") {
     EarlierRow(w);
     DynamicPlaces places;
-    OCIBind* binds[2] = {};
-    OCIDefine* define = nullptr;
     w.Prepare("insert into t(a, b) values((select max(a) + 1 from t), :1) returning b into :2");
-    for (const ub4 bind : {0, 1}) {
-        w.STEP(OCIBindByPos, w.stmt, &binds[bind], w.err, bind + 1, nullptr, 100, SQLT_CHR, nullptr, nullptr, nullptr, 0,
-               nullptr, OCI_DATA_AT_EXEC);
-        w.STEP(OCIBindDynamic, binds[bind], w.err, &places, DynamicPlaces::Give, &places, DynamicPlaces::Take);
+    for (const ub4 position : {1, 2}) {
+        OCIBind* const bind = w.Bind(position, {nullptr, 100, SQLT_CHR}, OCI_DATA_AT_EXEC);
+        w.STEP(OCIBindDynamic, bind, w.err, &places, DynamicPlaces::Give, &places, DynamicPlaces::Take);
     }
     ExecuteArray(w, 2);
     w.Prepare("select b from t where a = 1");
-    w.STEP(OCIDefineByPos, w.stmt, &define, w.err, 1, nullptr, 100, SQLT_CHR, nullptr, nullptr, nullptr,
-           OCI_DYNAMIC_FETCH);
+    OCIDefine* const define = w.Define(1, {nullptr, 100, SQLT_CHR}, OCI_DYNAMIC_FETCH);
     w.STEP(OCIDefineDynamic, define, w.err, &places, DynamicPlaces::Define);
     w.Execute(1);
     w.See(places.taken);
 }
 
-void StatementCache(World& w) {
+SCENARIO(StatementCache, session, Table, "1;2;1;3;2;") {
     ub4 size = 2;
     w.STEP(OCIAttrSet, w.svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, w.err);
     w.AtEnd([&w] {
@@ -446,7 +393,7 @@ void StatementCache(World& w) {
     }
 }
 
-void DescribedColumns(World& w) {
+SCENARIO(DescribedColumns, session, Table, "A;2;a column with a long name;1;D;12;A + 1;2;2;SECOND;") {
     w.Prepare("select a, b as \"a column with a long name\", d, a + 1 from t where a = :first or a = :second");
     w.Execute(0, OCI_DESCRIBE_ONLY);
     const ub4 count = w.Attribute<ub4>(OCI_ATTR_PARAM_COUNT);
@@ -471,58 +418,21 @@ void DescribedColumns(World& w) {
 }
 
 // An object, its list and a member, in UTF-16; a description that fails leaves none behind, and the handle serves anew.
-void DescribeTable(World& w) {
+SCENARIO(DescribeTable, session, Table, "A;", OCI_UTF16) {
     auto* describe = w.New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
     const struct { const char16_t* name; ub4 size; ub1 type; } objects[] = {
         {u"main", 8, OCI_PTYPE_SCHEMA}, {u"t", 2, OCI_PTYPE_TABLE}};
     for (const auto& object : objects) {
-        w.Step("OCIDescribeAny", [&] {
-            return OCIDescribeAny(w.svc, w.err, const_cast<char16_t*>(object.name), object.size, OCI_OTYPE_NAME,
-                                  OCI_DEFAULT, object.type, describe);
-        });
+        w.STEP(OCIDescribeAny, w.svc, w.err, const_cast<char16_t*>(object.name), object.size, OCI_OTYPE_NAME,
+               OCI_DEFAULT, object.type, describe);
     }
     auto* const root = w.Attribute<dvoid*>(OCI_ATTR_PARAM, describe, OCI_HTYPE_DESCRIBE);
     auto* const columns = w.Attribute<dvoid*>(OCI_ATTR_LIST_COLUMNS, root, OCI_DTYPE_PARAM);
     dvoid* column = nullptr;
-    w.Step("OCIParamGet", [&] { return OCIParamGet(columns, OCI_DTYPE_PARAM, w.err, &column, 1); });
+    w.STEP(OCIParamGet, columns, OCI_DTYPE_PARAM, w.err, &column, 1);
     const auto* const name = w.Attribute<const char16_t*>(OCI_ATTR_NAME, column, OCI_DTYPE_PARAM);
     w.See(std::u16string_view(name, 1) == u"A" ? "A" : "another");
 }
 
-constexpr Scenario kScenarios[] = {
-    {"ArrayInsert", Ground::session, Table, ArrayInsert,
-     "5;0earlier,10aa,20a text too long for a short string,30-,40-,50ee;"},
-    {"ArrayOfStructures", Ground::session, Table, ArrayOfStructures,
-     "earlier;a text too long for a short string;two;-;"},
-    {"BatchErrors", Ground::session, Table, BatchErrors, "2;1;1;1;3;0earlier,10aa,30-,50ee;"},
-    {"ManyTypesIn", Ground::session, Table, ManyTypesIn,
-     "7 2024-02-29 01:02:03 a string of the package 2024-07-15 13:14:15 70000 2.25;"},
-    {"Returning", Ground::session, Table, Returning,
-     "naa;na text too long for a short string;;0earlier,10naa,20na text too long for a short string,30-;"},
-    {"FunctionsAndComparisons", Ground::session, Table, FunctionsAndComparisons,
-     "1;0earlier,1Ann01 MARCH     2024*** 1,234.50;"},
-    {"Transactions", Ground::session, Table, Transactions, "1;1;"},
-    {"ChangesOfManyRows", Ground::session, Table, ChangesOfManyRows,
-     "2;a longer text for also earlier;0a longer text for earlier;"},
-    {"CommitsOnSuccess", Ground::session, Table, CommitsOnSuccess, "0earlier,1done;"},
-    {"Definition", Ground::session, Table, Definition, "0;1;"},
-    {"Block", Ground::session, Table, Block, "6;0earlier,1-,2-,3-;"},
-    {"BlockWithCursor", Ground::session, Table, BlockWithCursor, "a value that is not short at all;77;"},
-    {"BlockWithResultSet", Ground::session, nullptr, BlockWithResultSet, "a value that is not short at all;"},
-    {"IndexTables", Ground::session, Table, IndexTables, "5;number of the index table 5;"},
-    {"BlockThatUndoesItself", Ground::session, Table, BlockThatUndoesItself, "0earlier;"},
-    {"PiecesIn", Ground::session, Table, PiecesIn, "0earlier,1first and a longer one to follow it and last,2alone;"},
-    {"IntervalValues", Ground::session, TableOfIntervals, IntervalValues, "0;-01-02;"},
-    {"DynamicData", Ground::session, Table, DynamicData,
-     "a value that is given in two piecesa value that is given in two piecesa value that is given in two pieces;"},
-    {"StatementCache", Ground::session, Table, StatementCache, "1;2;1;3;2;"},
-    {"DescribedColumns", Ground::session, Table, DescribedColumns,
-     "A;2;a column with a long name;1;D;12;A + 1;2;2;SECOND;"},
-    {"DescribeTable", Ground::session, Table, DescribeTable, "A;", OCI_UTF16},
-};
-
 }  // namespace
-
-std::span<const Scenario> StatementScenarios() { return kScenarios; }
-
 }  // namespace faults

@@ -77,6 +77,15 @@ sword World::Fetch(ub4 rows, ub2 orientation, sb4 offset) {
     return STEP(OCIStmtFetch2, stmt, err, rows, orientation, offset, OCI_DEFAULT);
 }
 
+void World::Piece(const dvoid* data, ub4& length, ub1 piece) {
+    dvoid* handle = nullptr;
+    ub4 type = 0, iteration = 0, index = 0;
+    ub1 direction = 0, asked = 0;
+    STEP(OCIStmtGetPieceInfo, stmt, err, &handle, &type, &direction, &iteration, &index, &asked);
+    if (piece == kAsAsked) piece = asked;
+    STEP(OCIStmtSetPieceInfo, handle, type, err, data, &length, piece, nullptr, nullptr);
+}
+
 void World::Run(std::string_view sql) {
     Prepare(sql);
     Execute();
@@ -103,12 +112,13 @@ sb4 World::Number(dvoid* handle, ub4 type, std::string* text) {
 void World::CheckFailure(std::string_view name, Told told, sb4 also) {
     const std::string what = std::string(name) + ", without " + Seen().first;
     const sb4 own = err ? Number(err, OCI_HTYPE_ERROR) : 0;
-    EXPECT_TRUE(Seen().failed > 0 || also != kOutOfMemory) << name << " fails of itself: " << own;
+    const bool is_memory = Seen().failed > 0;
+    EXPECT_TRUE(is_memory || also != kOutOfMemory) << name << " fails of itself: " << own;
     if (told == Told::code) return;
     std::string text;
     const sb4 number =
         told == Told::error_handle ? Number(err, OCI_HTYPE_ERROR, &text) : Number(env, OCI_HTYPE_ENV, &text);
-    EXPECT_TRUE(number == kOutOfMemory || number == also) << number << ": " << what;
+    EXPECT_TRUE(number == kOutOfMemory ? is_memory : number == also) << number << ": " << what;
     rolled_back_ = text.find(kRolledBack) != std::string::npos;
 }
 
@@ -162,9 +172,9 @@ const std::string& World::Folder() {
 }
 
 OCIString*& NewString(World& w) {
-    const auto string = std::make_shared<OCIString*>(nullptr);
-    w.AtEnd([&w, string] { return *string ? OCIStringResize(w.env, w.err, 0, string.get()) : OCI_SUCCESS; });
-    return *string;
+    OCIString*& string = w.Kept<OCIString*>();
+    w.AtEnd([&w, &string] { return string ? OCIStringResize(w.env, w.err, 0, &string) : OCI_SUCCESS; });
+    return string;
 }
 
 }  // namespace faults

@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <functional>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -39,6 +40,7 @@ constexpr sb4 kOutOfMemory = 1019;
 
 // What is there before a scenario begins.
 enum class Ground { nothing, environment, session };
+using enum Ground;
 
 class World {
 public:
@@ -98,6 +100,8 @@ public:
     OCIDefine* Define(ub4 position, const Area& area, ub4 mode = OCI_DEFAULT);
     sword Execute(ub4 iterations = 1, ub4 mode = OCI_DEFAULT);
     sword Fetch(ub4 rows = 1, ub2 orientation = OCI_FETCH_NEXT, sb4 offset = 0);
+    // Gives a piece that a call has asked for, or a place for it.
+    void Piece(const dvoid* data, ub4& length, ub1 piece = kAsAsked);
     // Prepares and executes something that is no query.
     void Run(std::string_view sql);
     template <class T>
@@ -122,6 +126,13 @@ public:
     std::string One(std::string_view sql);
     // What ends what a step began, undisturbed: called when the scenario is over, the last given first.
     void AtEnd(std::function<sword()> end) { ends_.push_back(std::move(end)); }
+    // A place that outlives all that is given to AtEnd from now on.
+    template <class T>
+    T& Kept(T value = {}) {
+        const auto place = std::make_shared<T>(value);
+        AtEnd([place] { return OCI_SUCCESS; });
+        return *place;
+    }
     // What undoes by SQL what a scenario has committed.
     void CommitAtEnd(std::string_view sql, std::string_view more = "commit") {
         AtEnd([=, this] { return Sql(sql), Sql(more), Sql("commit"), OCI_SUCCESS; });
@@ -134,6 +145,8 @@ public:
         kept_rolled_back_ = rolled_back;
     }
     void CheckKept();
+    // Whether the record of the step that failed says so.
+    [[nodiscard]] bool RolledBack() const { return rolled_back_; }
     // The number of a handle's first record, 0 without one, and its text.
     static sb4 Number(dvoid* handle, ub4 type, std::string* text = nullptr);
     // Before each run: a statement that has not kept anything from the run before.
@@ -145,6 +158,7 @@ public:
 
     // What a record says where the transaction is lost.
     static constexpr const char* kRolledBack = "the transaction was rolled back";
+    static constexpr ub1 kAsAsked = 255;
     // How many worlds there have been in this process.
     static int Made() { return made_; }
 
@@ -183,11 +197,15 @@ private:
     std::vector<std::function<sword()>> ends_;
     std::string folder_, kept_query_;
     std::string kept_, kept_rolled_back_;
-    bool rolled_back_ = false;    // says the record of the step that failed
+    bool rolled_back_ = false;
 };
 
-// A step, or a call that never fails, that goes by the name of its function.
+// A step, also with where it is told and with a number that is as good, or a call that never fails, that goes by the
+// name of its function.
 #define STEP(function, ...) Step(#function, [&] { return function(__VA_ARGS__); })
+#define STEP_TOLD(told, function, ...) Step(#function, [&] { return function(__VA_ARGS__); }, told)
+#define STEP_OR(number, function, ...) \
+    Step(#function, [&] { return function(__VA_ARGS__); }, Told::error_handle, number)
 #define SURELY(function, ...) Surely(#function, [&] { return function(__VA_ARGS__); })
 
 // Has another handle stand where one of the world's stands, such as its statement, while this lives.
@@ -211,10 +229,26 @@ struct Scenario {
     const char* name;
     Ground ground;
     void (*prepare)(World&);    // tables and the like, undisturbed; may be null
-    void (*run)(World&);        // its steps; what they show goes to `seen`
     const char* expected;       // what a run without failure has seen
     ub4 mode = OCI_DEFAULT;     // of the environment
     bool first_calls = false;   // runs in new processes, too, where its steps are the first calls of all
+    void (*run)(World&) = nullptr;    // its steps; what they show goes to `seen`
 };
+
+inline std::vector<Scenario>& AllScenarios() {
+    static std::vector<Scenario> all;
+    return all;
+}
+inline bool Add(Scenario scenario, void (*run)(World&)) {
+    scenario.run = run;
+    AllScenarios().push_back(scenario);
+    return true;
+}
+
+// Stands before the steps of a scenario; behind its name, what its row has before them.
+#define SCENARIO(name, ...)                                                     \
+    void name(World& w);                                                        \
+    [[maybe_unused]] const bool added_##name = Add({#name, __VA_ARGS__}, name); \
+    void name(World& w)
 
 }  // namespace faults

@@ -1,7 +1,7 @@
 // The XA switch: a manager of the process, on a file of the world's folder, and a branch that makes two rows or none.
 #include <cstring>
 
-#include "faults/scenarios.h"
+#include "faults/world.h"
 #include "xa.h"
 
 namespace faults {
@@ -39,8 +39,19 @@ void XaStep(World& w, const char* name, int expected, Call call) {
         EXPECT_EQ(call(), expected) << name << ", repeated";
     });
 }
-void BranchStep(World& w, const char* name, Entry entry, xa_long flags) {
-    XaStep(w, name, XA_OK, [=] { return CallOf(entry, flags); });
+
+// Calls for the branch, one after the other.
+struct Leg { const char* name; Entry entry; xa_long flags; };
+Leg Start(xa_long flags) { return {"xa_start", &xa_switch_t::xa_start_entry, flags}; }
+Leg End(xa_long flags) { return {"xa_end", &xa_switch_t::xa_end_entry, flags}; }
+Leg Commit(xa_long flags) { return {"xa_commit", &xa_switch_t::xa_commit_entry, flags}; }
+void Go(World& w, std::initializer_list<Leg> legs) {
+    for (const Leg& leg : legs) XaStep(w, leg.name, XA_OK, [&] { return CallOf(leg.entry, leg.flags); });
+}
+
+void InsertRow(World& w) {
+    const Instead svc(w.svc, Session());
+    w.Run("insert into x values(1)");
 }
 
 void MakeTable(World& w) {
@@ -74,16 +85,8 @@ void Insert(World& w) {
         return OCITerminate(OCI_DEFAULT);
     });
     XaStep(w, "xa_open", XA_OK, Open);
-    BranchStep(w, "xa_start", &xa_switch_t::xa_start_entry, TMNOFLAGS);
-    const Instead svc(w.svc, Session());
-    w.Run("insert into x values(1)");
-}
-
-void InsertMore(World& w, xa_long leaves, xa_long takes_up) {
-    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, leaves);
-    BranchStep(w, "xa_start", &xa_switch_t::xa_start_entry, takes_up);
-    const Instead svc(w.svc, Session());
-    w.Run("insert into x values(2)");
+    Go(w, {Start(TMNOFLAGS)});
+    InsertRow(w);
 }
 
 void SeeRows(World& w) {
@@ -91,42 +94,31 @@ void SeeRows(World& w) {
     w.See(w.One("select count(*) from x"));
 }
 
-void TwoPhases(World& w) {
+SCENARIO(XaTwoPhases, session, MakeTable, "2;") {
     Insert(w);
-    InsertMore(w, TMSUSPEND, TMRESUME);
-    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMSUCCESS);
-    BranchStep(w, "xa_prepare", &xa_switch_t::xa_prepare_entry, TMNOFLAGS);
+    Go(w, {End(TMSUSPEND), Start(TMRESUME)});
+    InsertRow(w);
+    Go(w, {End(TMSUCCESS), {"xa_prepare", &xa_switch_t::xa_prepare_entry, TMNOFLAGS}});
     XaStep(w, "xa_recover", 1, Recovered);
-    BranchStep(w, "xa_commit", &xa_switch_t::xa_commit_entry, TMNOFLAGS);
+    Go(w, {Commit(TMNOFLAGS)});
     SeeRows(w);
     XaStep(w, "xa_close", XA_OK, Close);
 }
 
-void OnePhase(World& w) {
+SCENARIO(XaOnePhase, session, MakeTable, "2;") {
     Insert(w);
-    InsertMore(w, TMSUCCESS, TMJOIN);
-    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMSUCCESS);
-    BranchStep(w, "xa_commit", &xa_switch_t::xa_commit_entry, TMONEPHASE);
+    Go(w, {End(TMSUCCESS), Start(TMJOIN)});
+    InsertRow(w);
+    Go(w, {End(TMSUCCESS), Commit(TMONEPHASE)});
     SeeRows(w);
 }
 
-void RolledBack(World& w) {
+SCENARIO(XaRolledBack, session, MakeTable, "0;") {
     Insert(w);
-    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMSUSPEND | TMMIGRATE);
-    BranchStep(w, "xa_start", &xa_switch_t::xa_start_entry, TMRESUME);
-    BranchStep(w, "xa_end", &xa_switch_t::xa_end_entry, TMFAIL);
-    BranchStep(w, "xa_rollback", &xa_switch_t::xa_rollback_entry, TMNOFLAGS);
+    Go(w, {End(TMSUSPEND | TMMIGRATE), Start(TMRESUME), End(TMFAIL),
+           {"xa_rollback", &xa_switch_t::xa_rollback_entry, TMNOFLAGS}});
     SeeRows(w);
 }
-
-constexpr Scenario kScenarios[] = {
-    {"XaTwoPhases", Ground::session, MakeTable, TwoPhases, "2;"},
-    {"XaOnePhase", Ground::session, MakeTable, OnePhase, "2;"},
-    {"XaRolledBack", Ground::session, MakeTable, RolledBack, "0;"},
-};
 
 }  // namespace
-
-std::span<const Scenario> XaScenarios() { return kScenarios; }
-
 }  // namespace faults
