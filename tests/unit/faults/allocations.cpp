@@ -180,31 +180,19 @@ char* crypt_rn(const char* password, const char*, void* data, int size) {
 
 }  // extern "C"
 
+// Those of the language's that are in use; the others go through these.
 void* operator new(std::size_t size) { return faults::NewOrThrow(size); }
 void* operator new[](std::size_t size) { return faults::NewOrThrow(size); }
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept { return faults::New(size); }
-void* operator new[](std::size_t size, const std::nothrow_t&) noexcept { return faults::New(size); }
 void* operator new(std::size_t size, std::align_val_t alignment) {
     return faults::NewOrThrow(size, static_cast<std::size_t>(alignment));
 }
-void* operator new[](std::size_t size, std::align_val_t alignment) {
-    return faults::NewOrThrow(size, static_cast<std::size_t>(alignment));
-}
 void* operator new(std::size_t size, std::align_val_t alignment, const std::nothrow_t&) noexcept {
-    return faults::New(size, static_cast<std::size_t>(alignment));
-}
-void* operator new[](std::size_t size, std::align_val_t alignment, const std::nothrow_t&) noexcept {
     return faults::New(size, static_cast<std::size_t>(alignment));
 }
 void operator delete(void* block) noexcept { std::free(block); }
 void operator delete[](void* block) noexcept { std::free(block); }
 void operator delete(void* block, std::size_t) noexcept { std::free(block); }
 void operator delete[](void* block, std::size_t) noexcept { std::free(block); }
-void operator delete(void* block, const std::nothrow_t&) noexcept { std::free(block); }
-void operator delete[](void* block, const std::nothrow_t&) noexcept { std::free(block); }
 void operator delete(void* block, std::align_val_t) noexcept { std::free(block); }
-void operator delete[](void* block, std::align_val_t) noexcept { std::free(block); }
 void operator delete(void* block, std::size_t, std::align_val_t) noexcept { std::free(block); }
-void operator delete[](void* block, std::size_t, std::align_val_t) noexcept { std::free(block); }
-void operator delete(void* block, std::align_val_t, const std::nothrow_t&) noexcept { std::free(block); }
-void operator delete[](void* block, std::align_val_t, const std::nothrow_t&) noexcept { std::free(block); }

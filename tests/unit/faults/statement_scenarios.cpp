@@ -7,7 +7,6 @@ namespace {
 void Table(World& w) {
     w.Sql("create table t(a number primary key, b varchar2(100), d date, c char(8))");
     w.Sql("create table log(a number)");
-    w.Sql("create table spans(ym interval year to month, v varchar2(20))");
     w.Sql("create trigger written after insert on t begin insert into log values(new.a); end");
     w.Sql("create trigger gone after delete on t begin delete from log where a = old.a; end");
     w.Sql("create table many(a number, b date, c varchar2(40), d timestamp, e clob, f number)");
@@ -280,8 +279,10 @@ SCENARIO(BlockThatUndoesItself, session, Table, "0earlier;") {
     w.See(Rows(w));
 }
 
+void TableOfIntervals(World& w) { w.Sql("create table spans(ym interval year to month, v varchar2(20))"); }
+
 // Bound, defined, cast, as a text, and refused.
-SCENARIO(IntervalValues, session, Table, "0;-01-02;") {
+SCENARIO(IntervalValues, session, TableOfIntervals, "0;-01-02;") {
     auto* months = w.NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
     w.STEP(OCIIntervalFromText, w.env, w.err, World::Text("-1-2"), 4, months);
     w.Prepare("insert into spans values(:1, cast(:2 as interval year to month))");
