@@ -145,6 +145,23 @@ TEST_P(Contract, MarksNest) {
     EXPECT_EQ(Answer(connection_->UndoToMark()), 1086) << "the end of the transaction forgets them";
 }
 
+TEST_P(SharedContract, SerializableChangeBehindOthersIsRefused) {
+    MakeNumbers();
+    const auto other = Connect(), reader = Connect();
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::serializable)), 0);
+    EXPECT_EQ(All(), "1;2;3;");
+    const auto open = Prepared(*reader, "select n from t order by n");
+    Rows none;
+    ASSERT_EQ(Answer(open->Open(none, {})), 0);
+    ASSERT_EQ(Fetched(*open, 1), "1;");
+    SHOULD(Run(*other, "update t set n = 30 where n = 3"), Answer(other->Commit()));
+    EXPECT_EQ(Run("update t set n = 31 where n = 3"), 8177);
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_EQ(All(), "1;2;30;");
+    EXPECT_EQ(Run(*reader, "update t set n = n + 10"), 0) << "a write after a stale read";
+    EXPECT_EQ(Rest(*open), "2;3;");
+}
+
 TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
     ASSERT_EQ(Run("create table t(n integer)"), 0);
     engine::Xid xid{.format = -7, .global_length = 64, .branch_length = 64, .data = {'x', '\0', '\xFF'}};
