@@ -310,7 +310,7 @@ private:
         if (!goes && !IsCompound(select)) return;
         type_ = nullptr;
         for (const Names::Item& item : names_.Items(select)) {
-            if (item.is_all && names_.HasIntervals(select, item.qualifier)) Refuse();
+            if (item.is_all && names_.HasColumnOf(select, item.qualifier, IsIntervalType)) Refuse();
         }
     }
 

@@ -314,30 +314,29 @@ void Names::UseWith(Table& table) const {
     }
 }
 
-// Of an item "*" or "t.*" of a query: whether intervals are among what it stands for.
-bool Names::HasIntervals(std::size_t select, const std::string& qualifier) {
+bool Names::HasColumnOf(std::size_t select, const std::string& qualifier, TypeTest is_meant) {
     if (scopes_.empty()) ReadTables();
     for (const Table& table : tables_) {
-        const bool is_meant = qualifier.empty() || IsSame(table.name, qualifier);
-        if (table.scope != scopes_[select] || !is_meant) continue;
-        if (table.query == 0 ? TableHasIntervals(table.table) : QueryHasIntervals(table.query)) return true;
+        const bool is_named = qualifier.empty() || IsSame(table.name, qualifier);
+        if (table.scope != scopes_[select] || !is_named) continue;
+        if (table.query == 0 ? TableHasColumnOf(table.table, is_meant) : QueryHasColumnOf(table.query, is_meant)) return true;
     }
     return false;
 }
 
-bool Names::TableHasIntervals(const TableName& table) const {
+bool Names::TableHasColumnOf(const TableName& table, TypeTest is_meant) const {
     const std::vector<TableColumn> columns = InsertableColumns(database_, table);
-    return std::any_of(columns.begin(), columns.end(), [](const TableColumn& c) { return IsIntervalType(c.column.type); });
+    return std::any_of(columns.begin(), columns.end(), [&](const TableColumn& c) { return is_meant(c.column.type); });
 }
 
-bool Names::QueryHasIntervals(std::size_t query) {
+bool Names::QueryHasColumnOf(std::size_t query, TypeTest is_meant) {
     if (depth_ >= kDeepest) return true;
     ++depth_;
     const std::vector<Item> items = Items(query);
     const bool found = std::any_of(items.begin(), items.end(), [&](const Item& item) {
-        if (item.is_all) return HasIntervals(query, item.qualifier);
+        if (item.is_all) return HasColumnOf(query, item.qualifier, is_meant);
         const TableColumn* const column = TypeOf(item.expression);
-        return column && IsIntervalType(column->column.type);
+        return column && is_meant(column->column.type);
     });
     --depth_;
     return found;

@@ -5,6 +5,7 @@
 #include <sqlite3.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <deque>
 #include <string>
 #include <string_view>
@@ -37,7 +38,9 @@ public:
         std::string qualifier;
     };
     [[nodiscard]] std::vector<Item> Items(std::size_t select) const;
-    bool HasIntervals(std::size_t select, const std::string& qualifier);
+    // Of an item "*" or "t.*" of a query: whether columns of such a type are among what it stands for.
+    using TypeTest = bool (*)(std::uint16_t type);
+    bool HasColumnOf(std::size_t select, const std::string& qualifier, TypeTest is_meant);
 
 private:
     static constexpr int kDeepest = 30;      // a recursive query looks into itself
@@ -82,8 +85,8 @@ private:
     bool ExpandQuery(std::size_t query, std::vector<Listed>& columns);
     static bool IsMerged(const Table& table, const std::string& name, const std::vector<Listed>& before);
     [[nodiscard]] Item ReadItem(Span span) const;
-    [[nodiscard]] bool TableHasIntervals(const TableName& table) const;
-    bool QueryHasIntervals(std::size_t query);
+    [[nodiscard]] bool TableHasColumnOf(const TableName& table, TypeTest is_meant) const;
+    bool QueryHasColumnOf(std::size_t query, TypeTest is_meant);
     void ReadTables();
     [[nodiscard]] std::size_t MainQuery(std::size_t at) const;
     void NoteExcluded();

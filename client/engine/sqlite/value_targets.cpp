@@ -8,6 +8,7 @@
 #include "engine/pieces.h"
 #include "engine/sqlite/assignments.h"
 #include "engine/sqlite/comparisons.h"
+#include "engine/sqlite/date_uses.h"
 #include "engine/sqlite/interval_uses.h"
 #include "engine/sqlite/names.h"
 #include "engine/sqlite/number_uses.h"
@@ -107,6 +108,7 @@ Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_interv
     Status status = FindAssignments(database, sql, pieces, targets);
     StatementReading reading(database, sql, pieces);
     if (status.Ok()) status = FindComparisons(reading, targets);
+    if (status.Ok()) status = FindDateUses(reading);
     if (status.Ok()) FindNumberUses(reading, targets);
     const bool uses = has_intervals || sql.find(kSpanPrefix) != sql.npos;
     return status.Ok() && uses ? FindIntervalUses(reading, targets) : status;

@@ -59,7 +59,7 @@ struct ValueTargets {
 Status Convert(std::string_view text, const Column& column, Coercion::Purpose purpose, std::string& literal);
 
 // Looks through a statement that SQLite has found to be well-formed. Refuses what compares values in a way whose
-// meaning cannot be told, or uses intervals as numbers: 932, 933. Tables have none unless `has_intervals`.
+// meaning cannot be told, or uses dates or intervals as numbers: 932, 933. Tables have none unless `has_intervals`.
 Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_intervals, ValueTargets& targets);
 
 }  // namespace engine::sqlite
