@@ -109,7 +109,6 @@ struct ArrayRun {
 struct QueryRun {
     std::uint32_t row = 0;           // of the source
     bool scrollable = false;         // Scroll will be called
-    std::uint32_t prefetch = 0;      // how many rows the application is likely to ask for at a time; 0: not told
 };
 
 // One compiled statement. Destroying it closes what it has open. It must not outlive its connection, and is used no

@@ -190,7 +190,7 @@ Status Statement::Change(Compiled& compiled, const sql::Step& step, ub4 row, ub4
 // Exactly one row.
 Status Statement::SelectInto(Compiled& compiled, Targets& targets, ub4 row) {
     engine::Query& query = *compiled.query;
-    if (Status status = query.Open(compiled.rows, {row, false, 2}); !status.Ok()) return status;
+    if (Status status = query.Open(compiled.rows, {row, false}); !status.Ok()) return status;
     bool more = true;
     Status status = query.Fetch(targets, 2, more);
     query.Close();
@@ -204,7 +204,7 @@ Status Statement::SelectIntoTables(Compiled& compiled, const sql::Step& step, ub
     engine::Query& query = *compiled.query;
     Targets targets(text_, step, query, Targets::Layout::tables);
     targets.SetElements(row, 0);
-    if (Status status = query.Open(compiled.rows, {row, false, 0}); !status.Ok()) return status;
+    if (Status status = query.Open(compiled.rows, {row, false}); !status.Ok()) return status;
     constexpr std::uint32_t kBatch = 1000;
     Status status;
     for (bool more = true; more && status.Ok();) status = query.Fetch(targets, kBatch, more);
@@ -250,7 +250,7 @@ Status Statement::OpenResult(Compiled& compiled, const sql::Step& step, ub4 row)
     void* pointer;
     std::memcpy(&pointer, place, sizeof pointer);
     if ((!target && pointer) || target == this || (target && target->pieces_.Asks())) return Error(errors::kBadResultSet);
-    if (Status status = compiled.query->Open(compiled.rows, {row, false, prefetch_rows}); !status.Ok()) return status;
+    if (Status status = compiled.query->Open(compiled.rows, {row, false}); !status.Ok()) return status;
     std::unique_ptr<engine::Query> query = std::move(compiled.query);
     if (!target) target = Create<Statement>(Env(), OCI_HTYPE_STMT, 0);
     if (!bind->HasHandle()) return Error(errors::kNotAllBound);    // freed by a memory function

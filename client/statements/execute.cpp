@@ -197,7 +197,7 @@ Status Statement::RunQuery(const ExecuteArguments& arguments) {
         if (Status status = defines_.Activate(compiled->query->Columns(), text_.lobs); !status.Ok()) return status;
     }
     const bool scrollable = arguments.mode & OCI_STMT_SCROLLABLE_READONLY;
-    if (Status status = compiled->query->Open(compiled->rows, {0, scrollable, prefetch_rows}); !status.Ok()) {
+    if (Status status = compiled->query->Open(compiled->rows, {0, scrollable}); !status.Ok()) {
         described_ = was_described;
         return status;
     }
