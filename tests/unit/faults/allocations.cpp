@@ -9,6 +9,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <new>
+#include <utility>
 
 // Sanitizers bring a malloc of their own.
 #if defined(__GLIBC__) && !defined(FAULTS_BESIDE_SANITIZER)
