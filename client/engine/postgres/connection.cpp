@@ -100,7 +100,10 @@ LobStore* PgConnection::Lobs() { return lobs_.get(); }
 void PgConnection::Note() noexcept {
     const PGTransactionStatusType state = wire_->Transaction();
     const bool before = std::exchange(in_transaction_, !wire_->Broken() && (state == PQTRANS_INTRANS || state == PQTRANS_INERROR));
-    if (!before && in_transaction_) lobs_->TransactionBegins();
+    if (!before && in_transaction_) {
+        lobs_->TransactionBegins();
+        loss_ = {};
+    }
     if (before && !in_transaction_) {
         lobs_->Forget();
         SomethingUndone();

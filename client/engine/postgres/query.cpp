@@ -102,7 +102,8 @@ Status PgQuery::Prepare(std::uint32_t& error_offset) {
     if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return {};
     const bool within = connection_.InTransaction();
     Status status = PrepareText(error_offset);
-    return within && !connection_.InTransaction() && !connection_.Broken() ? connection_.Loss() : status;
+    const bool lost = within && !connection_.InTransaction() && !connection_.Broken();
+    return lost && !connection_.Loss().Ok() ? connection_.Loss() : status;
 }
 
 // A row's place is told by the insert itself, where the table has such a thing.
