@@ -130,7 +130,8 @@ bool AnyNull(int count, Arguments arguments) {
     return false;
 }
 
-TextArgument::TextArgument(sqlite3_value* value) {
+TextArgument::TextArgument(sqlite3_value* value, std::string_view usual) : text_(usual) {
+    if (!value) return;
     if (!IsNumber(value)) {
         text_ = TextOf(value);
         return;

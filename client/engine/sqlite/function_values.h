@@ -62,10 +62,10 @@ void ReturnNumber(sqlite3_context* context, const OCINumber& number);
 void ReturnDatum(sqlite3_context* context, const Datum& datum);
 void ReturnDate(sqlite3_context* context, const date::DateTime& value);
 
-// A value as text, numbers as they are shown.
+// A value as text, numbers as they are shown; `usual` where it is null, as of an argument that is missing.
 class TextArgument {
 public:
-    explicit TextArgument(sqlite3_value* value);
+    explicit TextArgument(sqlite3_value* value, std::string_view usual = {});
     TextArgument(const TextArgument&) = delete;
     TextArgument& operator=(const TextArgument&) = delete;
     [[nodiscard]] int Failure() const { return failure_; }    // 0 or an error number

@@ -40,9 +40,11 @@ template <Side side>
 void Pad(sqlite3_context* context, int count, Arguments arguments) {
     if (AnyNull(count, arguments)) return sqlite3_result_null(context);
     const TextArgument text(arguments[0]);
-    const std::string_view padding = count > 2 ? TextOf(arguments[2]) : " ";
+    const TextArgument filler(count > 2 ? arguments[2] : nullptr, " ");
+    const std::string_view padding = filler.Text();
     std::int64_t wanted = 0;
-    const int failure = text.Failure() != 0 ? text.Failure() : ReadWhole(arguments[1], wanted);
+    int failure = text.Failure() != 0 ? text.Failure() : filler.Failure();
+    if (failure == 0) failure = ReadWhole(arguments[1], wanted);
     if (failure != 0) return Refuse(context, failure);
     constexpr std::int64_t kLongest = 32767;
     wanted = std::clamp<std::int64_t>(wanted, 0, kLongest);
@@ -122,15 +124,16 @@ void Replace(sqlite3_context* context, int count, Arguments arguments) {
     if (AnyNull(1, arguments)) return sqlite3_result_null(context);
     const TextArgument text(arguments[0]);
     const TextArgument part(arguments[1]);
-    const std::string_view other = count > 2 ? TextOf(arguments[2]) : "";
-    const int failure = text.Failure() != 0 ? text.Failure() : part.Failure();
+    const TextArgument other(count > 2 ? arguments[2] : nullptr);
+    int failure = text.Failure() != 0 ? text.Failure() : part.Failure();
+    if (failure == 0) failure = other.Failure();
     if (failure != 0) return Refuse(context, failure);
     std::string_view rest = text.Text();
     std::string replaced;
     while (!part.Text().empty()) {
         const std::size_t found = rest.find(part.Text());
         if (found == std::string_view::npos) break;
-        replaced.append(rest.substr(0, found)).append(other);
+        replaced.append(rest.substr(0, found)).append(other.Text());
         rest.remove_prefix(found + part.Text().size());
     }
     replaced.append(rest);
