@@ -34,6 +34,7 @@ TEST(DateFromText, MissingFieldsAreOfToday) {
     const struct { const char *text, *model; int year, month, day; } cases[] = {
         {"13:14", "HH24:MI", now.year, now.month, 1}, {"02-03", "MM-DD", now.year, 2, 3},
         {"01-01-07", "DD-MM-YY", century + 7, 1, 1},
+        {"7-01", "Y-MM", now.year - now.year % 10 + 7, 1, 1}, {"007-01", "YYY-MM", now.year - now.year % 1000 + 7, 1, 1},
         {"0412", "YYMM", century + 4, 12, 1},    // four digits, but a number follows
         {"01-01-49", "DD-MM-RR", century + 49 + (first_half ? 0 : 100), 1, 1},
         {"01-01-50", "DD-MM-RR", century + 50 - (first_half ? 100 : 0), 1, 1}};

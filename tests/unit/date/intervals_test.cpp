@@ -44,10 +44,10 @@ struct IntervalCalls : CallFixture {
 
 TEST_F(IntervalCalls, TextsAreReadAndWritten) {
     const struct { bool months; const char* text; ub1 leading, fraction; const char* shown; } cases[] = {
-        {true, "2-3", 2, 0, "+02-03"}, {true, " -002-11 ", 1, 0, "-2-11"}, {true, "+7", 0, 0, "1873"},
+        {true, "2-3", 2, 0, "+02-03"}, {true, "  -002-11  ", 1, 0, "-2-11"}, {true, "+7", 0, 0, "1873"},
         {true, "0-0", 0, 9, "+0-00"}, {true, "1-12", 2, 0, "1843"}, {true, "999999999-11", 9, 0, "+999999999-11"},
         {true, "100-0", 2, 0, "1873"}, {true, "1-2", 10, 0, "30088"},
-        {false, "1 02:03:04.5", 2, 6, "+01 02:03:04.500000"}, {false, "-1 02:03:04.5", 2, 0, "-01 02:03:05"},
+        {false, "1 02:03:04.5", 2, 6, "+01 02:03:04.500000"}, {false, "-1  02:03:04.5", 2, 0, "-01 02:03:05"},
         {false, "-0 0:0:0.999999999", 2, 9, "-00 00:00:00.999999999"}, {false, "5", 1, 1, "+5 00:00:00.0"},
         {false, "9 23:59:59.95", 1, 1, "1873"}, {false, "9 23:59:59.95", 2, 1, "+10 00:00:00.0"},
         {false, "9 23:59:59.94", 1, 1, "+9 23:59:59.9"}, {false, "999999999 23:59:59.9", 9, 0, "1873"},
@@ -185,8 +185,11 @@ TEST_F(IntervalCalls, DifferencesOfMoments) {
 }
 
 TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
-    const auto* moment = Moment("2024-07-15 13:14:15.98765 Europe/Paris");
-    EXPECT_EQ(Shown(moment, "", 3), "15-JUL-24 01.14.15.987 PM Europe/Paris");
+    auto* moment = Moment("2024-07-15 13:14:15.98765 Europe/Paris");
+    auto* any = NewDescriptor<OCIDateTime>(OCI_DTYPE_INTERVAL_YM);    // of a datetime of any kind
+    EXPECT_EQ(Answer(OCIDateTimeConvert(env_, err_, moment, any)), 0);
+    for (const auto* shown : {moment, any})
+        EXPECT_EQ(Shown(shown, "", 3), "15-JUL-24 01.14.15.987 PM Europe/Paris");
     EXPECT_EQ(Shown(moment, "SS.FF", 0), "15.");
     EXPECT_EQ(Shown(moment, "SS.FF2", 9), "15.98");
     EXPECT_EQ(Shown(moment, "SS", 10), "30088");
@@ -210,7 +213,7 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
         EXPECT_EQ(size, 12u);
     }
     sb1 hour = 0, minute = 0;
-    const auto* plain = Moment("2024-07-15 00:00:00.5", OCI_DTYPE_TIMESTAMP);
+    auto* plain = Moment("2024-07-15 00:00:00.5", OCI_DTYPE_TIMESTAMP);
     EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, plain, &hour, &minute)), 1878);
     auto* date = NewDescriptor<OCIDateTime>(OCI_DTYPE_DATE);
     EXPECT_EQ(Answer(OCIDateTimeConvert(env_, err_, Moment("2024-07-15 10:00:00.5 +01:00"), date)), 0);
@@ -223,6 +226,7 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     EXPECT_EQ(Shown(time, "MI"), "1866");
     EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, time, 7, 8, 9, 0)), 0);
     EXPECT_EQ(Shown(time, "PM HH24:MI:SS SSSSS FF \"x\""), "AM 07:08:09 25689 000000000 x");
+    EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, plain, time, NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS))), 1878);
     for (const char* model : {"YYYY", "J", "MON", "DAY", "RM", "DL", "DS \"x\"", "fmDL"})
         EXPECT_EQ(Shown(time, model), "1878") << model;
 }

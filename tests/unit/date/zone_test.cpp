@@ -1,5 +1,6 @@
 // Time zones: offsets, regions, comparing.
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 
 #include <cstdlib>
 #include <ctime>
@@ -33,6 +34,13 @@ TEST(Zone, RegionsNameTheirSeasons) {
     }
     DateTime value = Read("2024-01-01");
     EXPECT_EQ(SetZone(std::string(100000, 'x'), &value), 1882);
+    rlimit files{};
+    getrlimit(RLIMIT_NOFILE, &files);
+    const rlimit none{0, files.rlim_max};
+    setrlimit(RLIMIT_NOFILE, &none);
+    EXPECT_EQ(SetZone("Asia/Tokyo", &value), 1019) << "no file can be opened for the moment";
+    setrlimit(RLIMIT_NOFILE, &files);
+    EXPECT_EQ(SetZone("Asia/Tokyo", &value), 0);
 }
 
 TEST(Zone, TheClockIsThatOfTheProcess) {
@@ -80,7 +88,7 @@ TEST(ZoneRules, TextsOfRules) {
     const struct { const char* text; std::int64_t moment; int offset; const char* name; } cases[] = {
         {"UTC0", 0, 0, "UTC"}, {"LMT-0:20:59", 0, 1259, "LMT"}, {"XXX+3:59", 0, -14340, "XXX"}, {"<+0330>-3:30", 0, 12600, "+0330"},
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846799, 3600, "CET"},
-        {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"}, {"EST5EDT", 1720000000, -14400, "EDT"},
+        {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"}, {"EST5EDT", 1710054000, -14400, "EDT"},
         {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
         {"XXX3YYY2,J59/0,300/0", 1709089199, -10800, "XXX"},  // J59 is 28 February, in leap years too
         {"XXX3YYY2,J59/0,300/0", 1709089200, -7200, "YYY"},
@@ -95,7 +103,7 @@ TEST(ZoneRules, TextsOfRules) {
         EXPECT_EQ(rules->At(c.moment).offset, c.offset) << c.text;
         EXPECT_EQ(rules->At(c.moment).abbreviation, c.name) << c.text;
     }
-    for (const char* text : {"", "UTC", "5", "CET-1CEST,", "CET-1CEST,M3.5.0", "CET-1CEST,M13.5.0,M10.5.0",
+    for (const char* text : {"", "UTC", "5", "CET-1CEST,", "CET-1CEST,M3.5.0", "CET-1CEST,M3.5.0,M10.5.0x", "CET-1CEST,M13.5.0,M10.5.0",
                              "CET-1CEST,M3.6.0,M10.5.0", "CET-1CEST,M3.6,M10.5.0", "CET-1CEST,M3.0.0,M10.5.0",
                              "CET-1CEST,M0.5.0,M10.5.0", "CET-1CEST,M3.5.7,M10.5.0", "CET-1CEST,366,M10.5.0",
                              "CET-1CEST,J366,M10.5.0", "<CET-1", "CET-999", "UTC0x", "LMT0:60", "LMT0:0:60", "LMT0:0:"}) {
@@ -103,26 +111,29 @@ TEST(ZoneRules, TextsOfRules) {
     }
 }
 
-// Files of one type and one change, each wrong by as little as can be.
+// Files of two types and one change, each wrong by as little as can be.
 TEST(ZoneRules, SmallFiles) {
     const struct { std::uint8_t index, letter; std::int32_t offset; bool read; } cases[] = {
-        {0, 0, 3600, true}, {1, 0, 3600, false}, {0, 3, 3600, true}, {0, 4, 3600, false}, {0, 0, 100000, true},
-        {0, 0, 100001, false}, {0, 0, -100000, true}, {0, 0, -100001, false}};
+        {1, 0, 3600, true}, {2, 0, 3600, false}, {1, 3, 3600, true}, {1, 4, 3600, false}, {1, 0, 100000, true},
+        {1, 0, 100001, false}, {1, 0, -100000, true}, {1, 0, -100001, false}};
     for (const auto& c : cases) {
         std::string bytes = "TZif" + std::string(16, '\0');
         const auto put = [&](std::int32_t number) {
             for (int shift = 24; shift >= 0; shift -= 8) bytes += static_cast<char>(number >> shift);
         };
-        for (const int count : {0, 0, 0, 1, 1, 4}) put(count);
-        put(1000);
+        for (const int count : {0, 0, 0, 1, 2, 4}) put(count);
+        put(-1000);
         bytes += static_cast<char>(c.index);
+        put(60);
+        bytes += {'\0', '\0'};
         put(c.offset);
         bytes += {'\0', static_cast<char>(c.letter), 'A', 'B', 'C', '\0'};
         const auto rules = ZoneRules::FromFile(bytes);
         ASSERT_EQ(rules.has_value(), c.read) << c.offset << ' ' << int{c.letter};
         if (!rules) continue;
-        EXPECT_EQ(rules->At(1000).offset, c.offset);
-        EXPECT_EQ(rules->At(999).abbreviation, c.letter ? "" : "ABC");
+        EXPECT_EQ(rules->At(-1000).offset, c.offset);
+        EXPECT_EQ(rules->At(-1000).abbreviation, c.letter ? "" : "ABC");
+        EXPECT_EQ(rules->At(-1001).offset, 60);
         EXPECT_FALSE(ZoneRules::FromFile(bytes.substr(0, bytes.size() - 1)));
     }
 }

@@ -150,6 +150,7 @@ TEST_F(Postgres, ServerThatGoesAway) {
         EXPECT_EQ(Answer(status), 3113) << name;
         EXPECT_TRUE(status.Detail().starts_with("terminating connection due to administrator command")) << status.Detail();
         EXPECT_EQ(Answer(call()), 3114) << name;
+        EXPECT_EQ(Answer(connection_->Rollback()), 3114) << name;
         query->Close();
         EXPECT_EQ(Fetched(*query, 1), "error 3114") << name;
         EXPECT_FALSE(connection_->HasNotices()) << "its last words are the error's: " << name;
@@ -304,6 +305,7 @@ TEST_F(Postgres, LongArraysAreOneStatement) {
         {"INSERT INTO T(M) VALUES ( %1 )", {Moment(day)}, "1;"},
         {"insert into t(m) values(%1)", {Text("01-JAN-24")}, "20;"},    {"insert into t(r) values(%1)", {Row(row)}, "20;"},
         {"insert into t(n) values(%1)", {Null()}, "20;"},               {"insert into t values(default)", {}, "20;"},
+        {"insert into t(n) values(%1) on conflict do nothing", {Integer(1)}, "20;"},
         {"insert into t(n) values(abs(%1))", {Integer(1)}, "20;"},      {"insert into t(n) select %1", {Integer(1)}, "20;"}};
     for (const auto& c : cases) {
         Rows rows;
