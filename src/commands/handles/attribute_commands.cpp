@@ -173,13 +173,12 @@ void PrintNumberBytes(const Reading& reading) {
     ReturnCodeReport(reading.error, DisplayElement(line, view));
 }
 
-// What buffers of the type hold.
+// What buffers of the type hold. It is of a fixed size: the whole word is read, whatever its length.
 template <int kType> bool TakeAsElement(Setting& setting, const char* word) {
     int16_t indicator = 0;
     uint16_t length = 0, return_code = 0;
     setting.value = setting.area;
-    return AssignText({kType, setting.area, sizeof setting.area, &indicator, &length, &return_code, 0, 0}, word,
-                      static_cast<long>(std::strlen(word)));
+    return AssignText({kType, setting.area, sizeof setting.area, &indicator, &length, &return_code, 0, 0}, word, 0);
 }
 
 // "invalid" is all that scripts can say.

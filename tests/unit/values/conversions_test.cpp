@@ -44,6 +44,7 @@ TEST_F(Conversions, IntervalColumns) {
     auto* days = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_DS), "!1867") << "never set";
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_YM), "!932") << "the other span";
+    EXPECT_EQ(Query("select '1 0:0:0' from dual", {{&months, 8, SQLT_INTERVAL_DS}}), 932);
     MustRun("create table spans(ym interval year to month, ds interval day to second, n number)");
     const struct { const char *ym, *ds; } cases[] = {
         {"+01-02", "+01 02:03:04.500000"}, {"-99-11", "-99 23:59:59.999499"}, {"+00-00", "+00 00:00:00.000000"}};
