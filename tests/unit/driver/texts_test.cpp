@@ -7,6 +7,8 @@
 
 namespace {
 
+using namespace std::string_literals;
+
 std::string Wide(std::string_view text) {
     std::string wide;
     for (const char character : text) wide += {character, '\0'};
@@ -62,6 +64,7 @@ TEST_F(Texts, ConvertFromUtf16) {
     EXPECT_EQ(output, "ab\xE4");
     EXPECT_TRUE(convertFromUTF16(nullptr, 6, output));
     EXPECT_EQ(output, "");
+    application_code_page = 13488;  // which has a stand-in, too
     second_code_page = 54936;
     EXPECT_TRUE(convertFromUTF16(Wide("\xE4\xE4").data(), 4, output));
     EXPECT_EQ(output, "\x81\x30\x8A\x31\x81\x30\x8A\x31") << "nothing is cut in a multi-byte code page";
@@ -75,9 +78,10 @@ TEST_F(Texts, ConvertFromUtf16) {
 
 TEST_F(Texts, WhatIsPassedCanBeReadUpToItsLength) {
     TextArgument argument;
-    ASSERT_TRUE(argument.Set(Token("scott"), 20000, TextArea::four_times));
+    ASSERT_TRUE(argument.Set(Token("scott\0of a longer word"s), 20000, TextArea::four_times));
     EXPECT_EQ(argument.Text()[19999], 0);
     EXPECT_STREQ(reinterpret_cast<const char*>(argument.Text()), "scott");
+    EXPECT_STREQ(reinterpret_cast<const char*>(argument.Text()) + 6, "of a longer word");
 }
 
 }  // namespace

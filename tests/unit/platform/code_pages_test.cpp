@@ -90,7 +90,8 @@ TEST(CodePages, WhatCannotBeConverted) {
         {1208, 1202, "\xF4\x90\x80\x80", "\xFD\xFF\xFD\xFF\xFD\xFF\xFD\xFF"},
         {1208, 1202, "é\xE4\xB8", "\xE9\0\xFD\xFF\xFD\xFF"s}, {1202, 1208, "\x34\xD8" "a\0"s, "\uFFFD" "a"},
         {1202, 1208, "\x1E\xDD", "\uFFFD"}, {1202, 1208, "a\0b"s, "a\uFFFD"}, {1202, 819, "a\0b"s, "a?"},
-        {1200, 1208, "\xD8\x34", "\uFFFD"}, {1208, 13488, "𝄞", "\xFF\xFD"}, {943, 1208, "a\x82", "a\uFFFD"}};
+        {1200, 1208, "\xD8\x34", "\uFFFD"}, {1208, 13488, "𝄞", "\xFF\xFD"}, {943, 1208, "a\x82", "a\uFFFD"},
+        {1255, 819, "\xE0\xE1" "a", "??a"}};
     for (const auto& c : cases) {
         const Converted converted = Convert(c.source, c.target, c.input);
         EXPECT_EQ(converted.result, kCodePageSubstituted) << c.source << " to " << c.target;

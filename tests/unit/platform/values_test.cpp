@@ -88,7 +88,8 @@ TEST(MessageTexts, OfDiagnosticsInLines) {
 TEST(MessageTexts, OfSqlstates) {
     const struct { const char* code; const char* text; } cases[] = {
         {"40001", "40001: transaction rollback: serialization failure"}, {"40003", "40003: transaction rollback"},
-        {"28000xyz", "28000: invalid authorization"}, {"00000", ""}, {"28", ""}, {"ZZ000", ""}, {"", ""}};
+        {"28000xyz", "28000: invalid authorization"}, {"HY000", "HY000: general error"}, {"00000", ""}, {"28", ""},
+        {"ZZ000", ""}, {"", ""}};
     for (const auto& c : cases) {
         char area[100];
         const std::size_t length = SqlstateMessageText(area, sizeof area, 80, "kelpsql.mo", c.code);
