@@ -82,11 +82,11 @@ TEST(RowStore, ReadsOnAfterAFailure) {
     for (int turn = 0; turn < 2; ++turn) {
         store.Clear();
         for (char row = 'a'; row < 'z'; ++row) {
-            const std::string text(4000000, row);
+            const std::string text(4000000, static_cast<char>(row - turn));
             const Datum values[] = {Text(text)};
             ASSERT_TRUE(store.Add(values).Ok()) << turn << row;
         }
-        EXPECT_EQ(At(store, 8, 1), std::string(4000000, 'i') + ';');
+        EXPECT_EQ(At(store, 8, 1), std::string(4000000, static_cast<char>('i' - turn)) + ';');
     }
     for (const auto& entry : std::filesystem::directory_iterator("/proc/self/fd")) {
         std::error_code none;
@@ -98,7 +98,7 @@ TEST(RowStore, ReadsOnAfterAFailure) {
     std::size_t row = 0;
     while (row < 25 && store.Read(row, value).Ok()) ++row;
     ASSERT_LT(row, 25u) << "a part of the file is gone";
-    EXPECT_EQ(At(store, row - 1, 1), std::string(4000000, static_cast<char>('a' + row - 1)) + ';');
+    EXPECT_EQ(At(store, row - 1, 1), std::string(4000000, static_cast<char>('a' + row - 2)) + ';');
 }
 
 // A file that may not grow: the row that does not fit is refused, those before it stay, and so does the next one.
