@@ -81,9 +81,7 @@ private:
     [[nodiscard]] std::size_t Clause(std::size_t at) const {
         while (at-- > 0) {
             if (At(at) == ")") at = operands_.Partner(at);
-            else if (At(at) == "(" || IsOneOf(At(at), {"select", "by", "set", "returning", "values", "from", "where", "having",
-                                                       "on", "limit", "using", "union", "except", "intersect"}))
-                return at;
+            else if (At(at) == "(" || IsOneOf(At(at), {"select", "by", "set", "returning", "values", "from", "limit"})) return at;
             if (at >= pieces_.size()) break;
         }
         return kNone;
