@@ -1,5 +1,6 @@
 // Large objects as an application uses them: locators of columns and temporary ones, characters, pieces, what is refused.
 #include <algorithm>
+#include <thread>
 
 #include "support/statement_fixture.h"
 
@@ -115,6 +116,14 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
         auto& self = *static_cast<decltype(this)>(context);
         ub4 length = 0;
         EXPECT_EQ(self.Answer(OCILobGetLength(self.svc, self.err, self.lob, &length)), 24820);
+        OCIStmt* made = nullptr;
+        std::thread([&] {
+            EXPECT_EQ(OCIHandleFree(self.New<OCIStmt>(OCI_HTYPE_STMT), OCI_HTYPE_STMT), OCI_SUCCESS);
+            made = self.New<OCIStmt>(OCI_HTYPE_STMT);
+        }).join();
+        const sb4 before = OCI_memGetMemCount();
+        EXPECT_EQ(OCIHandleFree(made, OCI_HTYPE_STMT), OCI_SUCCESS);
+        EXPECT_LT(OCI_memGetMemCount(), before) << "what others made meanwhile waits for nothing";
         return OCI_CONTINUE;
     };
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 4, this, asks, 0, 0)), 0);

@@ -86,8 +86,8 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
 // Arguments and answers that scripts neither give nor see.
 TEST_F(LegacyCalls, BesideTheTranscripts) {
     if (!server) {
-        EXPECT_EQ(Run("insert into t (rowid, n) values (1 * 65536 * 65536 * 65536 + 131075, 1)"), 0);
-        EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(1, 2u, 3));
+        EXPECT_EQ(Run("insert into t (rowid, n) values (72623859790382856, 1)"), 0);
+        EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(0x0102, 0x03040506u, 0x0708));
     }
     ub4 count = 5;
     EXPECT_EQ(odessp(&lda, Text("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
