@@ -219,7 +219,8 @@ INSTANTIATE_TEST_SUITE_P(Order, FreedInFlight, testing::Values(
     }));
 
 // A statement with open rows is freed while a call elsewhere is in, so that the end of that call destroys it, in its own
-// thread, beside a thread that works on the statement's session and then logs off.
+// thread, beside a thread that works on the statement's session and then logs off; in every other round that end comes
+// while a call holds the session.
 TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
     const sb4 before = OCI_memGetMemCount();
     for (int round = 0; round < 100; ++round) {
@@ -227,7 +228,10 @@ TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
         Objects shared;
         shared.Make(sql);
         OCIStmt* other = shared.NewStatement(sql);
-        ASSERT_EQ(shared.Execute(shared.stmt), OCI_SUCCESS);
+        dvoid* made = nullptr;
+        MUST(shared.Execute(shared.stmt), OCIDescriptorAlloc(shared.env, &made, OCI_DTYPE_LOB, 0, nullptr));
+        auto* const lob = static_cast<OCILobLocator*>(made);
+        MUST(OCILobCreateTemporary(shared.svc, shared.err, lob, 0, 0, OCI_TEMP_CLOB, FALSE, OCI_DURATION_SESSION));
         OwnMemory gate;    // an allocation waits in it until it may go on: a call that is in
         OCIEnv* elsewhere = nullptr;
         ASSERT_EQ(gate.Open(&elsewhere, OCI_THREADED), OCI_SUCCESS);
@@ -241,13 +245,25 @@ TEST(FreedElsewhere, StatementOfASessionThatOthersWorkOn) {
         });
         while (!is_in) std::this_thread::yield();
         EXPECT_EQ(OCIHandleFree(shared.stmt, OCI_HTYPE_STMT), OCI_SUCCESS);
-        std::thread working([&] {
+        std::function<void()> leave = [&] {
             open = true;
+            if (round % 2 == 0) in.join();
+        };
+        const auto gives = [](dvoid* context, dvoid*, ub4* length, ub1* piece) -> sb4 {
+            (*static_cast<std::function<void()>*>(context))();
+            *length = 1, *piece = OCI_LAST_PIECE;
+            return OCI_CONTINUE;
+        };
+        std::thread working([&] {
+            ub4 amount = 0;
+            if (round % 2 != 0) leave();
+            else SHOULD(OCILobWrite(shared.svc, shared.err, lob, &amount, 1, nullptr, 4, OCI_FIRST_PIECE, &leave, gives,
+                                    0, 0));
             for (int call = 0; call < round % 10; ++call) EXPECT_EQ(shared.Execute(other), OCI_SUCCESS);
             EXPECT_EQ(OCILogoff(shared.svc, shared.err), OCI_SUCCESS);
         });
-        in.join();
         working.join();
+        if (in.joinable()) in.join();
         SHOULD(OCIHandleFree(elsewhere, OCI_HTYPE_ENV), OCIHandleFree(shared.env, OCI_HTYPE_ENV));
         ASSERT_EQ(OCI_memGetMemCount(), before) << "round " << round;
     }
