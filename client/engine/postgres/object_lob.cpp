@@ -11,7 +11,7 @@
 namespace engine::postgres {
 namespace {
 
-constexpr std::uint64_t kLongest = std::uint64_t{1} << 42;       // bytes of an object, as the server has it
+constexpr std::uint64_t kLongest = std::uint64_t{INT32_MAX} * 2048;    // bytes of an object, as the server has it
 constexpr std::size_t kWindow = std::size_t{1} << 18;            // that are read ahead
 constexpr std::size_t kLargestWindow = std::size_t{1} << 26;
 constexpr std::size_t kMostWritten = std::size_t{8} << 20;       // as one value

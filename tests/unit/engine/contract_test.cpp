@@ -691,9 +691,27 @@ class ServerObjects : public LobContract {};
 TEST_P(ServerObjects, AreReadAsTheyAreNow) {
     MustCommit("create domain lo as oid", "create table o(k integer, c lo)", "insert into o values(3, lo_from_bytea(0, 'three'))");
     const Kept plain = Plain("select c from o where k = 3"), joined = Plain("select o.c from o, l where o.k = 3");
+    Rows values{{Integer(1)}, {Integer(0)}};
+    for (const char* change : {"insert into o values(1 / %1)", "insert into o values(1 / %1) returning k"}) {
+        const Kept changed = Locked();
+        MustRun("update l set k = k where k = 3");
+        Written returned;
+        EXPECT_EQ(Execute(*Prepared(change, values.rows[0]), values, {0, 2, false, &returned}), 1476);
+        EXPECT_EQ(Read(*changed), "error 22924") << "rows are not followed past what was undone";
+        ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    }
     const auto other = Connect();
     ASSERT_EQ(Run(*other, "select lo_put(c, 0, 'T') from o where k = 3"), 0);
     EXPECT_EQ(Read(*plain) + Read(*joined), "ThreeThree");
+    constexpr std::uint64_t kEnd = std::uint64_t{INT32_MAX} * 2048;
+    const Kept locked = Locked("select c from o where k = 3");
+    const struct { std::uint64_t at; const char* text; int number; } ends[] = {
+        {kEnd, "x", 22925}, {kEnd - 1, "xy", 22925}, {std::uint64_t{1} << 42, "x", 22925}, {kEnd - 1, "x", 0}};
+    for (const auto& [at, text, number] : ends) {
+        EXPECT_EQ(Read(*plain, at), "") << at;
+        EXPECT_EQ(Write(*locked, at, text), number) << at;
+    }
+    ASSERT_EQ(Answer(connection_->Rollback()), 0);
     EXPECT_EQ(Write(*joined, 0, "x"), 22920);
     ASSERT_EQ(Run(*other, "select lo_unlink(c) from o where k = 3"), 0);
     EXPECT_EQ(Read(*plain), "error 22922");

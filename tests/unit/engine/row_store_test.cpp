@@ -1,8 +1,9 @@
-// Rows that are kept: every kind of value, any order of reading, and what is left when memory or the disk fails.
+// Rows and bytes that are kept: every kind of value, any order of reading, and what is left when memory or the disk fails.
 #include <sys/resource.h>
 
 #include <csignal>
 
+#include "engine/chunked_bytes.h"
 #include "engine/engine_fixture.h"
 #include "engine/row_store.h"
 
@@ -101,16 +102,29 @@ TEST(RowStore, ReadsOnAfterAFailure) {
     EXPECT_EQ(At(store, row - 1, 1), std::string(4000000, static_cast<char>('a' + row - 2)) + ';');
 }
 
+// While one lives, no file grows beyond that size.
+class FilesOf {
+public:
+    explicit FilesOf(rlim_t size) {
+        getrlimit(RLIMIT_FSIZE, &before_);
+        const rlimit small{size, before_.rlim_max};
+        EXPECT_EQ(setrlimit(RLIMIT_FSIZE, &small), 0);
+    }
+    ~FilesOf() {
+        setrlimit(RLIMIT_FSIZE, &before_);
+        std::signal(SIGXFSZ, signal_);
+    }
+
+private:
+    rlimit before_{};
+    void (*signal_)(int) = std::signal(SIGXFSZ, SIG_IGN);
+};
+
 // A file that may not grow: the row that does not fit is refused, those before it stay, and so does the next one.
 TEST(RowStore, RefusedRowLeavesTheOthers) {
     engine::RowStore store;
     const std::string text(100000, 'x');
-    rlimit before{};
-    ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &before), 0);
-    const auto ignored = std::signal(SIGXFSZ, SIG_IGN);
-    rlimit small = before;
-    small.rlim_cur = 1000000;
-    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &small), 0);
+    auto small = std::make_unique<FilesOf>(1000000);
     std::uint64_t added = 0;
     Status status;
     for (; added < 1000; ++added) {
@@ -121,13 +135,42 @@ TEST(RowStore, RefusedRowLeavesTheOthers) {
     EXPECT_EQ(status.Number(), 1653);
     EXPECT_GT(added, 250u);
     EXPECT_EQ(store.Size(), added);
-    setrlimit(RLIMIT_FSIZE, &before);
-    std::signal(SIGXFSZ, ignored);
+    small.reset();
     const Datum last[] = {Integer(-1), Text(text)};
     ASSERT_TRUE(store.Add(last).Ok());
     EXPECT_EQ(At(store, added, 2), "-1;" + text + ';');
     for (std::uint64_t row = 0; row < added; ++row)
         ASSERT_EQ(At(store, row, 2), std::to_string(row) + ';' + text + ';');
+}
+
+// Behind 512 chunks in memory: what does not fit leaves what was there, before the first chunk and behind it.
+TEST(ChunkedBytes, StayWhereTheDiskIsFull) {
+    const auto file = std::make_shared<engine::ChunkFile>();
+    std::vector<std::uint32_t> others(512);
+    for (std::uint32_t& chunk : others) ASSERT_TRUE(file->Take(chunk).Ok());
+    engine::ChunkedBytes bytes(file, std::byte{'.'});
+    const std::string brief(3000, 'a'), text(100000, 'b');
+    const auto write = [&](std::uint64_t at, const std::string& part) { return bytes.Write(at, std::as_bytes(std::span(part))).Number(); };
+    std::string wanted = brief;
+    const auto is_whole = [&] {
+        std::string read(1000000, '#');
+        std::size_t length = 0;
+        return bytes.Read(0, std::as_writable_bytes(std::span(read)), length).Ok() && read.substr(0, length) == wanted;
+    };
+    ASSERT_EQ(write(0, brief), 0);
+    for (const std::uint64_t at : {3000, 250000}) {
+        const auto full = std::make_unique<FilesOf>(0);
+        EXPECT_EQ(write(at, text), 1653);
+        EXPECT_TRUE(is_whole()) << at;
+    }
+    for (const std::uint64_t at : {3000, 250000}) {
+        EXPECT_EQ(write(at, text), 0);
+        wanted.resize(at, '.');
+        wanted += text;
+        EXPECT_TRUE(is_whole()) << at;
+    }
+    file->GiveBack(others);
+    EXPECT_TRUE(is_whole());
 }
 
 }  // namespace
