@@ -272,12 +272,13 @@ TEST_F(Postgres, ListsWithLargeObjects) {
     }
 }
 
-TEST_F(Postgres, NamesThatAreNoTextAreRefused) {
+TEST_F(Postgres, NamesThatAreNoneAreRefused) {
     engine::ObjectDescription object;
     std::string schema = "\xFF";
     for (const auto kind : {engine::ObjectKind::any, engine::ObjectKind::schema, engine::ObjectKind::database})
         EXPECT_EQ(Answer(connection_->Describe("\xFF", kind, object)), 911);
     EXPECT_EQ(Answer(connection_->UseSchema(schema)), 911);
+    EXPECT_EQ(Run("savepoint \"A\"") + Run("rollback to a") + Run("rollback to \"A\""), 1086);
 }
 
 // What the end of a transaction runs has something to say, and loses the server.
