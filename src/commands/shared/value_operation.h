@@ -69,7 +69,7 @@ public:
     void PrintAndStore(OCIError* error) {
         if (!refused_ || ResultForm<T>::kPrintedAnyway) ResultForm<T>::Print(value_, error);
         if constexpr (ResultForm<T>::kStored)
-            if (word_ != nullptr && !refused_) ResultForm<T>::Store(word_, value_);
+            if (word_ != nullptr) ResultForm<T>::Store(word_, value_);  // "null" names no buffer
     }
 
 private:
