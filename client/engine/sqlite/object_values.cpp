@@ -22,8 +22,6 @@ constexpr std::string_view kWatchers =
     " union all select 1 from temp.sqlite_schema where type = 'table' and name = ?1 collate nocase and sql like '%check%'"
     " union all select 1 from pragma_table_xinfo(?1, ?2) where hidden in (2, 3))";
 
-Status TooLarge() { return Error(errors::kLobTooLarge).From("SQLITE"); }
-
 }  // namespace
 
 std::vector<ObjectTarget> FindObjectTargets(sqlite3* database, const ValueTargets& targets, LobStore& store) {
@@ -73,7 +71,7 @@ Status ObjectValues::Take(std::span<Datum> values, bool may_fill) {
         if (values[index].kind != Kind::lob) continue;
         auto* const lob = static_cast<Lob*>(const_cast<void*>(values[index].data));
         std::uint64_t length = 0;
-        if (Status status = lob->Length(length); status.Failed()) return status;
+        if (Status status = Measure(*lob, length); status.Failed()) return status;
         const ObjectTarget* const target = may_fill ? FindTarget(index, *lob) : nullptr;
         bool fills = target != nullptr;
         if (Status status = fills ? TableAllows(fills) : Status(); status.Failed()) return status;
@@ -88,11 +86,17 @@ std::uint64_t ObjectValues::LengthOf(const Datum& value) const {
         ->length;
 }
 
+Status ObjectValues::Measure(Lob& lob, std::uint64_t& length) const {
+    Status status = lob.Length(length);
+    if (status.Failed()) return status;
+    const auto most = static_cast<std::uint64_t>(sqlite3_limit(connection_.Database(), SQLITE_LIMIT_LENGTH, -1));
+    return length <= most ? status : Error(errors::kLobTooLarge).From("SQLITE");
+}
+
 Status ObjectValues::ReadWhole(std::size_t index, Datum& value) {
     auto* const lob = static_cast<Lob*>(const_cast<void*>(value.data));
     std::uint64_t length = 0;
-    if (Status status = lob->Length(length); status.Failed()) return status;
-    if (length > static_cast<std::uint64_t>(sqlite3_limit(connection_.Database(), SQLITE_LIMIT_LENGTH, -1))) return TooLarge();
+    if (Status status = Measure(*lob, length); status.Failed()) return status;
     if (held_.size() <= index) held_.resize(index + 1);
     std::string& held = held_[index];
     held.resize(static_cast<std::size_t>(length));

@@ -58,6 +58,7 @@ private:
     };
     const ObjectTarget* FindTarget(std::size_t parameter, const Lob& lob) const;
     Status TableAllows(bool& allows);
+    Status Measure(Lob& lob, std::uint64_t& length) const;    // 22925 for more than a value may have
     Status ReadWhole(std::size_t index, Datum& value);
     Status FillRow(const Waiting& object, std::int64_t row);
 

@@ -111,9 +111,10 @@ TEST_F(CallsTest, InitializeServesEnvInit) {
     ASSERT_EQ(
         OCIInitialize(OCI_UTF16 | OCI_OBJECT, &memory, OwnMemory::Allocate, OwnMemory::Reallocate, OwnMemory::Free), 0);
     OCIEnv* env = nullptr;
-    ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr), OCI_SUCCESS);
-    EXPECT_GT(memory.out, 0);
     dvoid *handle = nullptr, *extra = nullptr;
+    ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 9, &extra), OCI_SUCCESS);
+    EXPECT_GT(memory.out, 0);
+    EXPECT_TRUE(extra && Attribute<dvoid*>(env, OCI_HTYPE_ENV, OCI_ATTR_USER_MEMORY) == extra);
     ASSERT_EQ(OCIHandleAlloc(env, &handle, OCI_HTYPE_STMT, 9, &extra), OCI_SUCCESS);
     EXPECT_EQ(std::string(static_cast<char*>(extra), 9), std::string(9, '\0'));
     EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_USER_MEMORY), extra);

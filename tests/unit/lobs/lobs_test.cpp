@@ -107,6 +107,14 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
                                         GivesElsewhere, 0, 0)), 0);
     EXPECT_EQ(bytes * 10 + characters, 76u);
     EXPECT_EQ(Read(other), "7:\xC3\xA4xyabc\xC3\xA4");
+    EXPECT_EQ(Answer(OCILobWriteAppend(svc, err, other, &(amount = 1), &(room[0] = 'z'), 1, OCI_ONE_PIECE, nullptr, nullptr, 0, 0)), 0);
+    const auto moves = [](dvoid* context, const dvoid* data, oraub8 length, ub1, dvoid** changed, oraub8* room_there) -> sb4 {
+        static_cast<std::string*>(context)->append(static_cast<const char*>(data), length) += '|';
+        static char wider[5];
+        return *changed = wider, *room_there = sizeof wider, OCI_CONTINUE;
+    };
+    EXPECT_EQ(Answer(OCILobRead2(svc, err, other, &(bytes = 0), nullptr, 1, room, 2, OCI_FIRST_PIECE, &(taken = ""), moves, 0, 0)), 0);
+    EXPECT_EQ(taken, "\xC3\xA4|xyabc|\xC3\xA4z|");
     for (const ub4 length : {4u, 0u}) {    // room of the library's own
         Temporary(other);
         EXPECT_EQ(Answer(OCILobWrite(svc, err, other, &(amount = 0), 1, nullptr, length, OCI_FIRST_PIECE, &(pieces = {"abcdef"}), Gives, 0, 0)), 0);

@@ -56,6 +56,13 @@ TEST_F(FileCalls, OpeningsLeaveNoDescriptors) {
     ub4 count = 0;
     ASSERT_EQ(Open("made", OCI_FILE_READ_WRITE, OCI_FILE_EXIST, &file), 0);
     EXPECT_EQ(Answer(OCIFileRead(env_, err_, file, &count, kHuge, &count)), 30150) << "the system's own refusal";
+    EXPECT_EQ(Answer(OCIFileWrite(env_, err_, file, nullptr, 0, &count)), 30150);
+    std::string name(300, 'n');
+    ubig_ora length = 7;
+    ub1 exists = 7;
+    SHOULD(Answer(OCIFileGetLength(env_, err_, Text(name), Text(folder_), &length)) - 30150,
+           Answer(OCIFileExists(env_, err_, Text(name), Text(folder_), &exists)) - 30150);
+    EXPECT_EQ(length * exists, 49u) << "no answer";
 }
 
 // A thread waits in a read from a pipe, another in a close behind it, further ones behind that: the close is done once,

@@ -65,6 +65,7 @@ TEST_F(NlsCalls, NamesAndSettings) {
         EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), sizeof text, c.id), OCI_SUCCESS);
         EXPECT_STREQ(text, c.name);
     }
+    EXPECT_EQ(OCINlsCharSetNameToId(env_, Text("al32Utf8")), 873);
     EXPECT_EQ(OCINlsCharSetNameToId(env_, Text("none")) + OCINlsCharSetNameToId(nullptr, Text("UTF8")), 0);
     EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), 4, 871), OCI_ERROR);
     const struct { ub2 item; const char* text; } items[] = {

@@ -59,6 +59,11 @@ struct Work {
     std::atomic<int> failures{0};
 };
 
+TEST_F(ThreadCalls, NothingIsMadeWhereSomethingLives) {
+    OCIThreadMutex* mutex = NewMutex();
+    EXPECT_EQ(Answer(OCIThreadMutexInit(env_, err_, &mutex)), 21560);
+}
+
 TEST_F(ThreadCalls, AThreadThatNobodyKnows) {
     EXPECT_EQ(Answer(OCIThreadCreate(env_, err_, CountDestroyed, nullptr, nullptr, nullptr)), 0);
     while (destroyed == 0) std::this_thread::yield();
