@@ -206,14 +206,13 @@ void PgQuery::ReadAhead() noexcept {
     if (connection_.Streams(this)) Leave();
 }
 
-// The rest is of no use. Not much of it is passed over; a query that goes on sending is stopped, unless that undid more
-// than reading.
+// The rest is of no use. Not much of it is passed over; a query that goes on sending is stopped.
 void PgQuery::Leave() noexcept {
     Wire& server = connection_.Server();
     const Wire::Heeding undisturbed(server, false);
     if (!delivers_) row_.reset();
     bool more = true;
-    for (int row = 0; more && (row < kRowsBeforeCancel || effect_ != Effect::reads); ++row) more = server.Next() != nullptr;
+    for (int row = 0; more && row < kRowsBeforeCancel; ++row) more = server.Next() != nullptr;
     if (more) server.Cancel();
     Status rest = server.Drain();
     connection_.Stream(nullptr);
