@@ -598,6 +598,11 @@ TEST_P(LobContract, ItsRowIsKnownHoweverTheTableIsNamed) {
     const Kept replaced = Locked();
     ASSERT_EQ(Run("insert or replace into l(rowid, k, c) values(3, 3, 'new')"), 0);
     EXPECT_EQ(Write(*replaced, 0, "x"), 22922) << "the object of the row that another took the place of";
+    MustCommit("create temp table l(k integer, c clob)", "insert into temp.l(rowid, k, c) values(3, 3, 'mine')");
+    ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
+    const Kept other = Plain("select c from main.l where k = 3"), mine = Plain("select c from temp.l where k = 3");
+    EXPECT_EQ(Write(*Locked("select c from temp.l where k = 3"), 0, "M"), 0);
+    EXPECT_EQ(Read(*other) + ' ' + Read(*mine), "new error 22924") << "tables of one name";
 }
 
 TEST_P(LobContract, OneThatIsNotLockedIsReadOnlyAndWhatItWas) {
