@@ -60,8 +60,8 @@ TEST_F(FileCalls, OpeningsLeaveNoDescriptors) {
     std::string name(300, 'n');
     ubig_ora length = 7;
     ub1 exists = 7;
-    SHOULD(Answer(OCIFileGetLength(env_, err_, Text(name), Text(folder_), &length)) - 30150,
-           Answer(OCIFileExists(env_, err_, Text(name), Text(folder_), &exists)) - 30150);
+    SHOULD(Answer(OCIFileGetLength(env_, err_, Text(name), Text(folder_), &length)) - 30160,
+           Answer(OCIFileExists(env_, err_, Text(name), Text(folder_), &exists)) - 30160);
     EXPECT_EQ(length * exists, 49u) << "no answer";
 }
 
