@@ -57,6 +57,8 @@ TEST_F(Ini, AreasOfEveryLength) {
     const std::string keys = "key\0other\0"s;
     for (std::size_t capacity = 0; capacity < 14; ++capacity)
         EXPECT_EQ(Read("s", nullptr, capacity), capacity < 5 ? "" : keys.substr(0, capacity < 11 ? 4 : 10)) << capacity;
+    Put("[s]\nempty=\n");
+    EXPECT_EQ(Read("s", "absent") + Read("s", "empty"), "none");
 }
 
 TEST_F(Ini, AWriteChangesOneLine) {
