@@ -266,6 +266,7 @@ TEST_F(Lobs, FormsOfEachKind) {
     MustRun("create table n(n nclob)", "insert into n values('x')");
     Fetch(lob, "select n from n", SQLT_DBCLOB);
     expect(SQLCS_NCHAR, 2000);
+    EXPECT_EQ(Ready("update n set n = lower(:v)", {Locator(lob, SQLT_DBCLOB)}) + Execute(), 0) << "a text";
     Fetch(lob);
     expect(SQLCS_IMPLICIT, 873);
 }

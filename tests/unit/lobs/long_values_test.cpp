@@ -113,7 +113,7 @@ TEST_F(LongValues, ComeBackWholeFromEachKindOfTable) {
     const struct { const char *columns, *more; ub2 type, locator; On on = On::both; } cases[] = {
         {"k number, c clob", "", SQLT_CHR, SQLT_CLOB},
         {"k number, c blob", "", SQLT_LBI, SQLT_BLOB},
-        {"k number, c clob, l number", "", SQLT_STR, SQLT_DBCLOB},
+        {"k number, c clob, l number", "", SQLT_STR, SQLT_CLOB},
         {"k number, c long", "", SQLT_LNG, SQLT_CLOB},
         {"k number, c long raw", "", SQLT_BIN, SQLT_BLOB},
         {"k number, c clob check (c like 'over%')", "", SQLT_CHR, SQLT_CLOB},
