@@ -688,6 +688,12 @@ TEST_P(LobContract, LongOnesAreReadWhileTheirRowsCome) {
         EXPECT_EQ(Answer(query->Fetch(rows, 100, more)), 0);
     }
     EXPECT_EQ(rows.seen, "1x100000row 1;2-0row 2;3x100000row 3;1x100000row 1;2-0row 2;3x100000row 3;");
+    if (!GetParam().brings_lobs) return;
+    const Kept plain = Plain();
+    const auto other = Connect();
+    MUST(Run(*other, "delete from l"), Answer(other->Commit()), Run(*other, "vacuum l"), Run(*other, "alter table l set (toast_tuple_target = 128)"),
+         Run(*other, "insert into l select k, repeat('y', 100000) from generate_series(1, 500) k"), Answer(other->Commit()));
+    EXPECT_EQ(Read(*plain, 99'990).substr(0, 10), "error 2292") << "another row lies where it lay";
 }
 
 // Those that a server keeps for themselves, by numbers in a column: read and written in place, seen as they are now.
