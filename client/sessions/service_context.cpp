@@ -64,6 +64,19 @@ constexpr AttributeRow kRows[] = {
     {OCI_ATTR_IN_V8_MODE, Shape::ub1, Get<S, GetInCurrentMode>, nullptr},
 };
 
+// The own server's, of a logon that may come to nothing: its error, or lack of memory, is what counts then.
+class Attachment {
+public:
+    explicit Attachment(Server& server) : server_(&server) {}
+    ~Attachment() { if (server_) (void)server_->Detach(); }
+    Attachment(const Attachment&) = delete;
+    Attachment& operator=(const Attachment&) = delete;
+    void Keep() noexcept { server_ = nullptr; }
+
+private:
+    Server* server_;
+};
+
 }  // namespace
 
 ServiceContext::ServiceContext(const Origin& origin)
@@ -127,12 +140,11 @@ Status ServiceContext::LogOn(const Target& target, const engine::Credentials& cr
     Session& session = OwnSession();
     Status status = target.source ? server.Attach(target.source) : server.Attach(target.database);
     if (status.Failed()) return status;
+    Attachment attachment(server);
     status = session.Begin(server, credentials);
-    if (status.Failed()) {
-        (void)server.Detach();    // it has nothing open: the logon's own error is what counts
-        return status;
-    }
+    if (status.Failed()) return status;
     if (const std::shared_ptr<Link> link = session.ShareLink()) session.user = link->user;
+    attachment.Keep();
     server_.Set(&server);
     session_.Set(&session);
     obtained_ = ended_by == EndedBy::release;
@@ -193,11 +205,11 @@ Status ServiceContext::TakeOver(ServiceContext& from) {
     Server& server = OwnServer();
     Session& session = OwnSession();
     Status status = server.AttachLike(*from.own_server_);
-    if (status.Ok()) status = session.TakeOver(*from.own_session_, server);
-    if (status.Failed()) {
-        (void)server.Detach();
-        return status;
-    }
+    if (status.Failed()) return status;
+    Attachment attachment(server);
+    status = session.TakeOver(*from.own_session_, server);
+    if (status.Failed()) return status;
+    attachment.Keep();
     server_.Set(&server);
     session_.Set(&session);
     logged_on_ = true;

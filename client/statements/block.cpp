@@ -97,22 +97,28 @@ Status Statement::RunBlock(const ExecuteArguments& arguments) {
     } catch (const std::bad_alloc&) {
         status = Error(errors::kOutOfMemory);
     }
-    if (status.Ok()) return stretch.Keep();
+    if (!status.Failed()) {
+        Status kept = stretch.Keep();
+        return kept.Ok() ? status : kept;
+    }
     UsedLink()->Answered(status);
     Status undone = stretch.Undo();
     return undone.Ok() ? status : undone;
 }
 
+// A step's warning, such as a commit's, stops nothing and is told at the end.
 Status Statement::RunSteps(const ExecuteArguments& arguments, Stretch& stretch) {
+    Status told;
     for (ub4 row = arguments.first; row < arguments.iterations; ++row) {
         for (std::size_t index = 0; index < Scanned().steps.size(); ++index) {
             Status status = RunStep(index, row, stretch);
             stretch.Look();
-            if (!status.Ok()) return status;
+            if (status.Failed()) return status;
+            if (!status.Ok()) told = std::move(status);
         }
         ++run_.row_count;
     }
-    return {};
+    return told;
 }
 
 Status Statement::RunStep(std::size_t index, ub4 row, Stretch& stretch) {

@@ -84,7 +84,5 @@ Status Cursor::AnyMore(bool& more) {
 
 Status Cursor::Count(std::uint64_t& rows) {
     const LongCall may_take_long;
-    Status status = query_->Count(rows);
-    if (status.Ok()) reached_ = rows;
-    return status;
+    return query_->Count(rows);
 }

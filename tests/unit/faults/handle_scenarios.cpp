@@ -27,11 +27,16 @@ void LogOffAtEnd(World& w) {
     w.AtEnd([&w, svc = w.svc] { return w.svc = nullptr, OCILogoff(svc, w.err); });
 }
 
+// On a context that is there: after a failure it serves the next logon.
 void LogOn(World& w, std::string_view user, std::string_view password, std::string_view database) {
-    w.svc = nullptr;
-    w.STEP(OCILogon, w.env, w.err, &w.svc, user.empty() ? nullptr : World::Text(user), World::Size(user),
-           user.empty() ? nullptr : World::Text(password), World::Size(password), World::Text(database),
-           World::Size(database));
+    w.svc = w.New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+    const auto log_on = [&] {
+        return OCILogon(w.env, w.err, &w.svc, user.empty() ? nullptr : World::Text(user), World::Size(user),
+                        user.empty() ? nullptr : World::Text(password), World::Size(password), World::Text(database),
+                        World::Size(database));
+    };
+    Attempt([&] { w.Step("OCILogon", log_on); },
+            [&] { EXPECT_EQ(log_on() + OCILogoff(std::exchange(w.svc, nullptr), w.err), OCI_SUCCESS); });
     LogOffAtEnd(w);
 }
 

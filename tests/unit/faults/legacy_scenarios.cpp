@@ -124,9 +124,12 @@ SCENARIO(UndoneWhole, environment, nullptr, "0;3;4;4;") {
 
 SCENARIO(LoginToContext, environment, nullptr, "0;") {
     Areas& areas = LogOn(w);
-    OCISvcCtx* service = nullptr;
+    auto* service = w.New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
+    w.AtEnd([service, &w] {
+        OCISvcCtx* again = service;    // a failure leaves it as it was
+        return OCILogon(w.env, w.err, &again, nullptr, 0, nullptr, 0, World::Text(":memory:"), 8) + OCILogoff(service, w.err);
+    });
     Bridged(areas, [&] { w.STEP(OCILdaToSvcCtx, &service, w.err, &areas.login); });
-    w.AtEnd([service, &w] { return OCILogoff(service, w.err); });
     w.STEP(OCITransCommit, service, w.err, OCI_DEFAULT);
     w.See(areas.login.rc);
 }

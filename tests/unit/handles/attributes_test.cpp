@@ -148,7 +148,7 @@ void AttributesTest::Check(char kind, const Handle& handle, const Known& known) 
         EXPECT_EQ(size, bytes);
         EXPECT_EQ(Answer(OCIAttrGet(handle.pointer, handle.type, nullptr, &size, known.number, err_)), 21560);
     }
-    ub4 value = known.number == OCI_ATTR_CHARSET_ID ? 873 : 1;
+    ub4 value = known.number == OCI_ATTR_CHARSET_ID ? 873 : width == '4' ? 0x10000 + known.number : 1;
     static char identifier[140] = "xid";
     dvoid* pointer = nullptr;
     if (width == 'h' && known.number < 90) std::memcpy(&pointer, area, sizeof pointer);
@@ -189,12 +189,14 @@ TEST_F(AttributesTest, DigitsOfDatetimes) {
     OCIDefine* define = nullptr;
     static OCIDateTime* moment = nullptr;
     ASSERT_EQ(Run(svc_, stmt_, err_, "select b from t", 0), 0);
-    ASSERT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &moment, 8, SQLT_TIMESTAMP, nullptr, nullptr, nullptr,
-                                    OCI_DEFAULT)), 0);
-    ub1 digits[2] = {3, 77};
-    for (const ub4 attribute : {OCI_ATTR_FSPRECISION, OCI_ATTR_LFPRECISION}) {
-        EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, attribute, digits), 0);
-        EXPECT_EQ((Attribute<std::pair<ub1, ub1>>(define, OCI_HTYPE_DEFINE, attribute)), std::pair(ub1{3}, ub1{0}));
+    ub1 digits[2] = {2, 77};
+    for (const ub2 type : {SQLT_TIMESTAMP, SQLT_INTERVAL_YM, SQLT_INTERVAL_DS}) {
+        ASSERT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &moment, 8, type, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
+        ++digits[0];
+        for (const ub4 attribute : {OCI_ATTR_FSPRECISION, OCI_ATTR_LFPRECISION}) {
+            EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, attribute, digits), 0);
+            EXPECT_EQ((Attribute<std::pair<ub1, ub1>>(define, OCI_HTYPE_DEFINE, attribute)), std::pair(digits[0], ub1{0}));
+        }
     }
     digits[0] = 10;
     EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, OCI_ATTR_FSPRECISION, digits), 24328);

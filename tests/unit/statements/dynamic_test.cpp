@@ -130,6 +130,9 @@ TEST_F(Dynamic, ValuesGoInByIteration) {
         EXPECT_EQ(Execute(c.rows), c.answer) << c.asked;
         EXPECT_EQ(giver.asked, c.asked);
         EXPECT_EQ(One("select group_concat(nvl(a, '-'), ',') from t"), c.stored);
+        giver.next = 0, giver.asked.clear();
+        EXPECT_EQ(Execute(c.rows), c.answer) << "anew, from the first iteration";
+        EXPECT_EQ(giver.asked, c.asked);
         MustRun("drop table t");
     }
 }
