@@ -52,6 +52,13 @@ SCENARIO(FromNothing, nothing, nullptr, "abc;", OCI_THREADED | OCI_OBJECT, true)
     w.See(text);
 }
 
+SCENARIO(LogonBeside, session, nullptr, "") {
+    OCISvcCtx*& other = w.Kept<OCISvcCtx*>();
+    const std::string database = w.Database();
+    w.STEP(OCILogon, w.env, w.err, &other, nullptr, 0, nullptr, 0, World::Text(database), World::Size(database));
+    w.AtEnd([&] { return OCILogoff(other, w.err); });
+}
+
 // The older way in, and a logon that brings the statement cache along.
 SCENARIO(InitializeAndLogOn2, nothing, nullptr, "20;") {
     w.STEP_TOLD(Told::code, OCIInitialize, w.mode, nullptr, ApplicationMemory::Allocate, nullptr,

@@ -37,10 +37,12 @@ void World::OpenEnvironment() {
 
 void World::OpenSession() {
     server_ = ServerOfTheTest();
-    const std::string database = Encoded(server_ ? server_->Url() : ":memory:");
+    const std::string database = Encoded(Database());
     Must(OCILogon(env, err, &svc, nullptr, 0, nullptr, 0, Text(database), Size(database)), "OCILogon");
     Must(OCIHandleAlloc(env, reinterpret_cast<dvoid**>(&quiet_), OCI_HTYPE_STMT, 0, nullptr), "OCIHandleAlloc");
 }
+
+std::string World::Database() const { return server_ ? server_->Url() : ":memory:"; }
 
 // ---- Steps
 

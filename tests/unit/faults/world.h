@@ -168,6 +168,7 @@ public:
     static ub4 Size(std::string_view text) { return static_cast<ub4>(text.size()); }
 
     [[nodiscard]] bool OnServer() const { return server_ != nullptr; }
+    [[nodiscard]] std::string Database() const;
 
     const ub4 mode;    // of the environment
     OCIEnv* env = nullptr;
