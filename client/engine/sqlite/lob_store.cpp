@@ -403,13 +403,12 @@ void LobStore::Forget() noexcept {
     undone_at_ = ++now_;
 }
 
+// What was open when a draft was made has been read ahead, and what opens settles first.
 Status LobStore::Settle() {
     open_.Close();
     if (drafts_.empty()) return {};
     auto drafts = std::exchange(drafts_, {});
     if (!connection_.InTransaction()) return {};    // lost with it
-    const Status read = connection_.ReadAhead(nullptr);
-    if (!connection_.InTransaction()) return RolledBack(read);
     Status first;
     flushes_ = true;
     for (auto& draft : drafts) {
