@@ -462,6 +462,8 @@ TEST_P(Contract, AnotherConnectionIsOfTheSameUserAndSeparate) {
     ASSERT_EQ(Run("insert into t values(4)"), 0);
     stop_->Ask();
     EXPECT_EQ(Query(*another, "select count(*) from t"), "3;") << "neither the other's work nor its wish is its";
+    theirs->Ask();
+    EXPECT_EQ(Query(*another, "select count(*) from t"), "error 1013");
 }
 
 TEST_P(Contract, SchemaTellsItsObjects) {

@@ -66,6 +66,11 @@ TEST_F(Postgres, ServerThatCannotBeReached) {
     EXPECT_EQ(LogOn("\"" + server_->Owner() + "\"", "secret"), 0);
     for (const auto& c : cases) EXPECT_EQ(Answer(engine::Open(c.url, none)), c.number) << c.url;
 
+    std::unique_ptr<engine::Connection> patient;
+    MUST(Answer(engine::Open(server_->Url() + "&options=-c%20lock_timeout%3D77", none)), Answer(none->Connect({"", "", true}, stop_, patient)));
+    EXPECT_EQ(Query(*patient, "select current_setting('lock_timeout')"), "77ms;");
+    patient.reset();
+
     // Somebody listens and says nothing.
     const int listener = socket(AF_UNIX, SOCK_STREAM, 0);
     sockaddr_un place{.sun_family = AF_UNIX, .sun_path = {}};
@@ -263,7 +268,7 @@ TEST_F(Postgres, ListsWithLargeObjects) {
     const struct { const char* sql; bool is_object; } cases[] = {
         {"select c from l where k = 3;", true}, {"select c from l where k = %1 and k = %2", true},
         {"select c from l where k = %1 and k = %2 and $$;$$ <> '--'", false}, {"select c as a$ from l", false},
-        {"select c from l as a$", false}, {"select c from l where c <> '\\'", true},
+        {"select c from l as a$", false}, {"select c from l where k = (array[3])[(array[1])[1]];", true}, {"select c from l where c <> '\\'", true},
         {"select c from l where c <> E'\\';'", false}};
     for (const auto& c : cases) {
         const bool has_values = std::string_view(c.sql).find('%') != std::string_view::npos;
@@ -323,6 +328,8 @@ TEST_F(Postgres, LongArraysAreOneStatement) {
     const auto truncate = Prepared("truncate t, s");
     MUST(Run("deallocate all"), Execute(*truncate, one));
     EXPECT_TRUE(Executed(*Prepared("INSERT INTO T VALUES (1)"), one).last_row);
+    for (int run = 0; run < 30; ++run) MUST(Run("insert into t values(1)"), Run("deallocate all"));
+    EXPECT_EQ(Query("select count(*) from t"), "31;") << "the engine's own statements are given up behind the transaction";
 }
 
 }  // namespace
