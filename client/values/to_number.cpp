@@ -124,10 +124,6 @@ int OwnReal(const Datum& datum, Workspace&, double& value) {
     value = datum.real;
     return 0;
 }
-int RealOfSingle(const Datum& datum, Workspace&, double& value) {
-    value = SingleByDigits(datum.real);
-    return 0;
-}
 template <auto render>
 int RealOfNumber(const Datum& datum, Workspace& workspace, double& value) {
     OCINumber number;
@@ -184,6 +180,6 @@ const ByOrigin<OutConverter> kToInt = kIntegerRow<std::int64_t, PutInt, IntOfInt
 const ByOrigin<OutConverter> kToUin = kIntegerRow<std::uint64_t, PutUin, UintOfInteger>;
 const ByOrigin<OutConverter> kToFlt =
     kRow<double, PutFlt, RealOfInteger, OwnReal, RealOfNumber<OwnNumber>, RealOfNumber<NumberOfText>, OwnReal,
-         RealOfSingle>;
+         OwnReal>;
 
 }  // namespace values
