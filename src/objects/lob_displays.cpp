@@ -24,6 +24,7 @@ struct LobData {
     char bytes[1000 + 2] = {};  // room for a closing zero that the library has none for
     sb2 indicator = 0;
     ub2 length = 0;
+    ub2 code = 0;  // with a place for it, data that are cut are no error
 };
 
 bool Succeeded(sword rc) {
@@ -34,7 +35,8 @@ sword ReadData(OCILobLocator* locator, uint16_t type, LobData& data) {
     constexpr sb4 kShown = 1000;
     OneRowQuery query;
     query.Prepare(QueryFor(type));
-    query.Define(data.bytes, kShown, type == SQLT_BLOB ? SQLT_BIN : SQLT_STR, &data.indicator, &data.length);
+    query.Define(data.bytes, kShown, type == SQLT_BLOB ? SQLT_BIN : SQLT_STR, &data.indicator, &data.length,
+                 &data.code);
     query.Bind(&locator, sizeof locator, type);
     return query.Execute();
 }

@@ -57,11 +57,11 @@ void OneRowQuery::Bind(void* value, sb4 size, ub2 type) {
                nullptr, nullptr, ub4{0}, nullptr, ub4{OCI_DEFAULT});
 }
 
-void OneRowQuery::Define(void* value, sb4 size, ub2 type, sb2* indicator, ub2* length) {
+void OneRowQuery::Define(void* value, sb4 size, ub2 type, sb2* indicator, ub2* length, ub2* code) {
     if (rc_ != OCI_SUCCESS) return;
     OCIDefine* define = nullptr;
     rc_ = Call(&ClientLibrary::OCIDefineByPos, statement_, &define, DefaultErrorHandle, ub4{1}, value, size, type,
-               indicator, length, nullptr, ub4{OCI_DEFAULT});
+               indicator, length, code, ub4{OCI_DEFAULT});
 }
 
 sword OneRowQuery::Execute() {

@@ -14,7 +14,8 @@ public:
     // Each does nothing after one that failed. What is bound and defined must live until the query has run.
     void Prepare(const char* sql);
     void Bind(void* value, sb4 size, ub2 type);
-    void Define(void* value, sb4 size, ub2 type, sb2* indicator = nullptr, ub2* length = nullptr);
+    void Define(void* value, sb4 size, ub2 type, sb2* indicator = nullptr, ub2* length = nullptr,
+                ub2* code = nullptr);
     // The return code of what failed, else that of the execution.
     sword Execute();
 
