@@ -66,7 +66,7 @@ private:
         if (!IsPlainName(At(at)) || Before(at) == ".") return {};
         const std::string_view before = Before(at);
         if (IsOneOf(before, {"as", "from", "join", "into", "update", "table", "view", "end"})) return {};
-        if (before == ")" || IsPlainName(before) || IsNumber(before) || IsLiteral(before)) return {};
+        if (before == ")" || IsPlainName(before) || IsNumber(before) || before.ends_with('\'')) return {};
         if (before == "," && IsWord(At(Clause(at)), "from")) return {};
         std::size_t last = at + 1;
         if (At(last) == "(") {
