@@ -26,23 +26,26 @@ const TableColumn* Names::TypeOf(Span span) {
         const TableColumn* const column = TypeOf(choice);
         if (column && IsMoment(column->column)) return column;
     }
-    if (!IsName(At(span.first))) return nullptr;
+    const TableColumn* const column = IsName(At(span.first)) ? AnswerOf(span) : nullptr;
+    return column && IsMoment(column->column) ? column : nullptr;
+}
+
+const TableColumn* Names::AnswerOf(Span span) {
+    if (span.Size() == 0) return nullptr;
     const ExpressionType type = ReadType({pieces_.begin() + static_cast<std::ptrdiff_t>(span.first),
                                           pieces_.begin() + static_cast<std::ptrdiff_t>(span.last)});
-    const TableColumn* column = nullptr;
     if (!type.argument.empty()) {
         const auto first = static_cast<std::size_t>(
             std::find_if(pieces_.begin(), pieces_.end(),
                          [&](auto piece) { return piece.data() == type.argument.front().data(); }) -
             pieces_.begin());
-        column = Resolve({first, first + type.argument.size()});
-    } else if (!type.declared.empty()) {
-        TableColumn answered;
-        answered.declared = type.declared;
-        answered.concerned = ReadDeclaredType(type.declared, answered.column);
-        column = &columns_.emplace_back(std::move(answered));
+        return Resolve({first, first + type.argument.size()});
     }
-    return column && IsMoment(column->column) ? column : nullptr;
+    if (type.declared.empty()) return nullptr;
+    TableColumn answered;
+    answered.declared = type.declared;
+    answered.concerned = ReadDeclaredType(type.declared, answered.column);
+    return &columns_.emplace_back(std::move(answered));
 }
 
 // ---- Names

@@ -27,6 +27,8 @@ public:
     const TableColumn* Resolve(Span name);
     // The column that an expression is, or one of the type of the date or interval that it answers; else null.
     const TableColumn* TypeOf(Span span);
+    // The column that an expression is, or one of the type that its text tells; else null.
+    const TableColumn* AnswerOf(Span span);
     // 932 when a name was of a date or an interval in one table and of another type in another.
     [[nodiscard]] const Status& Failure() const { return status_; }
 

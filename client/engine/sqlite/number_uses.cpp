@@ -1,6 +1,7 @@
 // One pass over the pieces. A cast stays one, for its result is compared as an integer then.
 #include "engine/sqlite/number_uses.h"
 
+#include <algorithm>
 #include <string_view>
 
 #include "engine/sqlite/column_types.h"
@@ -19,7 +20,10 @@ public:
     void Find() {
         for (std::size_t at = operands_.FirstExpression(); at < pieces_.size(); ++at) {
             if (pieces_[at] == "||") Concatenation(at);
-            else if (IsWord(pieces_[at], "cast") && operands_.At(at + 1) == "(") Cast(at + 1);
+            else if (IsWord(pieces_[at], "like")) NumberAsText(operands_.Before(at - (IsWord(operands_.At(at - 1), "not") ? 1 : 0)));
+            else if (operands_.At(at + 1) != "(") continue;
+            else if (IsWord(pieces_[at], "cast")) Cast(at + 1);
+            else if (IsOneOf(pieces_[at], {"length", "lower", "upper", "trim", "ltrim", "rtrim"})) Call(at + 1);
         }
     }
 
@@ -34,6 +38,25 @@ private:
 
     void AsText(Span span) {
         if (span.Size() > 0 && !IsNoNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+    }
+
+    // A call of the engine's own that takes texts, whose parenthesis opens at `open`.
+    void Call(std::size_t open) {
+        if (const std::size_t close = operands_.Partner(open); close < pieces_.size())
+            for (const Span argument : operands_.List({open, close + 1})) NumberAsText(argument);
+    }
+
+    void NumberAsText(Span span) {
+        if (MayBeNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+    }
+
+    bool MayBeNumber(Span span) {
+        if (span.Size() == 1 && ParameterOf(operands_.At(span.first)) != kNoParameter) return true;
+        const TableColumn* const column = names_.AnswerOf(span);
+        const std::uint16_t type = column ? column->column.type : 0;
+        if (column) return IsNumberType(type) || type == SQLT_IBFLOAT || type == SQLT_IBDOUBLE;
+        const std::vector<Span> choices = operands_.Choices(span);
+        return std::any_of(choices.begin(), choices.end(), [&](Span choice) { return MayBeNumber(operands_.Bare(choice)); });
     }
 
     bool IsNoNumber(Span span) {
