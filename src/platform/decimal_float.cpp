@@ -61,12 +61,12 @@ public:
             Take(character - '0');
             if (fraction) --exponent;
         }
-        if (round_up_) ++coefficient;
         return any;
     }
 
     Coefficient coefficient = 0;
     int exponent = 0;
+    bool round_up = false;  // for those who keep all digits
 
 private:
     void Take(int digit) {
@@ -75,14 +75,13 @@ private:
             if (coefficient != 0) ++taken_;
             return;
         }
-        if (taken_ == format_.digits) round_up_ = digit >= 5;
+        if (taken_ == format_.digits) round_up = digit >= 5;
         ++taken_;
         ++exponent;
     }
 
     const Format& format_;
     int taken_ = 0;  // significant digits seen
-    bool round_up_ = false;
 };
 
 bool ReadExponent(std::string_view text, int& exponent) {
@@ -92,7 +91,7 @@ bool ReadExponent(std::string_view text, int& exponent) {
     return error == std::errc() && end == text.data() + text.size() && exponent > -kSane && exponent < kSane;
 }
 
-bool ReadParts(std::string_view text, const Format& format, Parts& value) {
+bool ReadParts(std::string_view text, const Format& format, Parts& value, bool& round_up) {
     value.negative = text.starts_with('-');
     if (value.negative || text.starts_with('+')) text.remove_prefix(1);
     const size_t mark = text.find_first_of("eE");
@@ -101,13 +100,16 @@ bool ReadParts(std::string_view text, const Format& format, Parts& value) {
     if (!digits.Read(text.substr(0, mark))) return false;
     if (mark != std::string_view::npos && !ReadExponent(text.substr(mark + 1), exponent)) return false;
     value.coefficient = digits.coefficient;
+    round_up = digits.round_up;
     value.exponent = digits.exponent + exponent;
     return true;
 }
 
-// Brings coefficient and exponent into the format's range. False when the value is too large for it.
-bool Fit(Parts& value, const Format& format) {
+// Brings coefficient and exponent into the format's range, rounded once: where more digits go, the first of them decides.
+// False when the value is too large for it.
+bool Fit(Parts& value, bool round_up, const Format& format) {
     const Coefficient limit = PowerOfTen(format.digits);
+    if (round_up && value.exponent >= -format.bias) ++value.coefficient;
     if (value.coefficient == limit) {  // rounding carried over
         value.coefficient /= 10;
         ++value.exponent;
@@ -170,7 +172,8 @@ void Pack(const Parts& parts, std::size_t size, void* bytes) {
 bool FromText(std::string_view text, std::size_t size, void* bytes) {
     const Format& format = FormatOf(size);
     Parts value;
-    if (!ReadParts(text, format, value) || !Fit(value, format)) return false;
+    bool round_up = false;
+    if (!ReadParts(text, format, value, round_up) || !Fit(value, round_up, format)) return false;
     Pack(value, size, bytes);
     return true;
 }

@@ -23,7 +23,7 @@ bool Fits(ub2 length, const MemBuffer& buffer) {
 }
 
 bool IsTextBuffer(const MemBuffer& buffer) {
-    if (buffer.type == SQLT_STR && buffer.data != nullptr) return true;
+    if (buffer.type == SQLT_STR && buffer.Complete()) return true;
     Message(kError, "Buffer must be of type SQLT_STR\n");
     return false;
 }
