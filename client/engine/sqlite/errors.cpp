@@ -150,11 +150,9 @@ const Status kTransactionLost =
 Status Failure(int code, std::string_view words) noexcept { return Told(NumberOf(code, Verb::other, words), words); }
 
 Status Failure(sqlite3* database, int code, Verb verb) noexcept {
-    const int extended = sqlite3_extended_errcode(database);
     const std::string_view words = sqlite3_errmsg(database);
     if ((code & 0xFF) == SQLITE_ERROR && words.starts_with(kErrorMark)) return ToldByFunction(words.substr(kErrorMark.size()));
-    const int told = (extended & 0xFF) == (code & 0xFF) ? extended : code;
-    const int number = MayNotGrow(told) ? errors::kNoRoom : NumberOf(told, verb, words);
+    const int number = MayNotGrow(code) ? errors::kNoRoom : NumberOf(code, verb, words);
     return Told(number, words);
 }
 

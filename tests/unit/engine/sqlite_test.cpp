@@ -34,15 +34,15 @@ protected:
 
 // Texts in UTF-16 come and go as UTF-8, empty ones too; what is no date stays a text.
 TEST_F(Sqlite, WhatOtherProgramsWroteIsRead) {
-    ByHand("pragma encoding = 'UTF-16le'; create table t(v varchar2(9), d date, c char(3), s timestamp with time zone, i span_ds(1,0));"
-           "insert into t values('ä€', '2024-02-29 00:00:00', 'é', '12:30:00', 'long'), ('', null, '', null, null),"
-           "('x', 'soon', 'x', '2024-02-29 01:02:03.5 +01:00', 1728000500000000), (null, 5, null, null, null)", "/wide.db");
+    ByHand("pragma encoding = 'UTF-16le'; create table t(v varchar2(9), d date, c char(3), s timestamp with time zone, i span_ds(1,0), l clob);"
+           "insert into t values('ä€', '2024-02-29 00:00:00', 'é', '12:30:00', 'long', 'ö€'), ('', null, '', null, null, ''),"
+           "('x', 'soon', 'x', '2024-02-29 01:02:03.5 +01:00', 1728000500000000, null), (null, 5, null, null, null, 5)", "/wide.db");
     connection_.reset();
     ASSERT_TRUE(engine::Open(folder_ + "/wide.db", database_).Ok());
     connection_ = Connect();
-    EXPECT_EQ(Query("select v, d, c, s, i from t"),
-              "ä€,time 2024-02-29 00:00:00,é ,12:30:00,long;,null,   ,null,null;"
-              "x,soon,x  ,time 2024-02-29 01:02:03.5 +01:00,+000000020 00:00:00.500000000;null,5,null,null,null;");
+    EXPECT_EQ(Query("select v, d, c, s, i, l from t"),
+              "ä€,time 2024-02-29 00:00:00,é ,12:30:00,long,ö€;,null,   ,null,null,;"
+              "x,soon,x  ,time 2024-02-29 01:02:03.5 +01:00,+000000020 00:00:00.500000000,null;null,5,null,null,null,5;");
 }
 
 TEST_F(Sqlite, BoundMomentsAreWrittenAsTheirColumnsAre) {
