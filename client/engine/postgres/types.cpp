@@ -439,11 +439,15 @@ Status BoundValues::Set(std::span<const Datum> values) {
 }
 
 // The customary models, or the engines' own form.
-static int ReadDate(std::string_view text, date::DateTime& value) {
+static int ReadDate(std::string_view text, Oid type, date::DateTime& value) {
     if (date::FromEngineText(text, &value) == 0 && value.month != 0) return 0;
     const int error = date::FromText(text, date::kDateModel, date::kEnglish, date::Scope::date, &value);
     if (error == 0) return 0;
-    return date::FromText(text, date::kTimestampModel, date::kEnglish, date::Scope::timestamp, &value) == 0 ? 0 : error;
+    const auto read = [&](std::string_view model) {
+        return date::FromText(text, model, date::kEnglish, date::Scope::timestamp, &value);
+    };
+    if (read(date::kTimestampModel) == 0) return 0;
+    return type == oid::kMoment ? read(date::kTimestampZoneModel) : error;
 }
 
 // "2-3", "4 05:06:07.8" with a sign or without; what the server's own words say is left to it. A number alone may be years
@@ -465,7 +469,7 @@ int BoundValues::WriteText(std::size_t index, std::string_view text) {
     }
     date::DateTime date;
     if (types_[index] == oid::kTimestamp || types_[index] == oid::kMoment) {
-        const int error = ReadDate(text, date);
+        const int error = ReadDate(text, types_[index], date);
         return error != 0 ? error : WriteTime(index, date);
     }
     if (types_[index] == oid::kInterval) {
