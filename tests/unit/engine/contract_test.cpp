@@ -724,7 +724,9 @@ TEST_P(ServerObjects, AreReadAsTheyAreNow) {
         EXPECT_EQ(Read(*plain, at), "") << at;
         EXPECT_EQ(Write(*locked, at, text), number) << at;
     }
+    const std::uint64_t version = locked->Version();
     ASSERT_EQ(Answer(connection_->Rollback()), 0);
+    EXPECT_NE(locked->Version(), version) << "the bytes are others";
     EXPECT_EQ(Write(*joined, 0, "x"), 22920);
     ASSERT_EQ(Run(*other, "select lo_unlink(c) from o where k = 3"), 0);
     EXPECT_EQ(Read(*plain), "error 22922");
