@@ -178,8 +178,7 @@ Status PgConnection::Compile(const StatementSource& source, std::unique_ptr<Quer
         if (Status status = made->Prepare(error_offset); !status.Ok()) return status;
         query = std::move(made);
         return {};
-    } catch (const std::bad_alloc&) {
-        (void)wire_->Drain();
+    } catch (const std::bad_alloc&) {    // between questions: what has been sent is answered
         return Refused(errors::kOutOfMemory);
     }
 }
