@@ -20,7 +20,7 @@ public:
     void Find() {
         for (std::size_t at = operands_.FirstExpression(); at < pieces_.size(); ++at) {
             if (pieces_[at] == "||") Concatenation(at);
-            else if (IsWord(pieces_[at], "like")) NumberAsText(operands_.Before(at - (IsWord(operands_.At(at - 1), "not") ? 1 : 0)));
+            else if (IsWord(pieces_[at], "like")) Like(at);
             else if (operands_.At(at + 1) != "(") continue;
             else if (IsWord(pieces_[at], "cast")) Cast(at + 1);
             else if (IsOneOf(pieces_[at], {"length", "lower", "upper", "trim", "ltrim", "rtrim"})) Call(at + 1);
@@ -38,6 +38,12 @@ private:
 
     void AsText(Span span) {
         if (span.Size() > 0 && !IsNoNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+    }
+
+    void Like(std::size_t at) {
+        const bool is_not = at > 0 && IsWord(operands_.At(at - 1), "not");
+        NumberAsText(operands_.Before(is_not ? at - 1 : at));
+        NumberAsText(operands_.From(at + 1));
     }
 
     // A call of the engine's own that takes texts, whose parenthesis opens at `open`.
