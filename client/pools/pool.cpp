@@ -222,7 +222,7 @@ Status Pool::TakeOrReserve(const engine::Credentials& credentials, const Session
     return status;
 }
 
-// One that broke while it rested goes, and another is taken.
+// One that the server has closed while it rested goes, and another is taken.
 Status Pool::Take(const engine::Credentials& named, const SessionWish& wish, Connected& connected) {
     const engine::Credentials& credentials = WhoBegins(named);
     for (;;) {

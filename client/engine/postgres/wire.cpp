@@ -193,6 +193,12 @@ void Wire::Push() noexcept {
     PQconsumeInput(connection_);    // the server may wait for its answers to be taken
 }
 
+bool Wire::Closed() noexcept {
+    pollfd place{PQsocket(connection_), POLLIN, 0};
+    while (!broken_ && Idle() && poll(&place, 1, 0) == 1) broken_ = PQconsumeInput(connection_) != 1;
+    return broken_;
+}
+
 // ---- Receiving
 
 // Until something has come from the server, or there is nothing to wait for.

@@ -44,6 +44,7 @@ public:
 
     [[nodiscard]] PGconn* Libpq() const { return connection_; }
     [[nodiscard]] bool Broken() const { return broken_; }
+    [[nodiscard]] bool Closed() noexcept;    // looks whether the server has, when nothing is awaited from it
     [[nodiscard]] std::string Where() const {    // host, port and database
         return std::string(PQhost(connection_)) + ':' + PQport(connection_) + '/' + PQdb(connection_);
     }
