@@ -288,6 +288,16 @@ TEST_P(Contract, OpenQueryDeliversTheRowsThatThereWereWhenItWasOpened) {
     }
 }
 
+TEST_P(SharedContract, LaterQuerySeesWhatOthersHaveCommitted) {
+    MakeNumbers();
+    const auto open = Opened("select n from t");
+    const auto other = Connect();
+    const std::string head = Fetched(*open, 1);
+    MUST(Run(*other, "insert into t values(4)"), Answer(other->Commit()));
+    EXPECT_EQ(Count(), "4;");
+    EXPECT_EQ(Sorted(head + Rest(*open)), "1;2;3;");
+}
+
 // ---- Stopping
 
 // The first of an endless query's rows is no sooner there than the query is stopped.
@@ -609,6 +619,9 @@ TEST_P(LobContract, ItsRowIsKnownHoweverTheTableIsNamed) {
 
 TEST_P(LobContract, OneThatIsNotLockedIsReadOnlyAndWhatItWas) {
     Kept lob = Plain();
+    if (GetParam().shared && !GetParam().brings_lobs) {
+        EXPECT_EQ(Query(*Connect(), "pragma wal_checkpoint(truncate)"), "0,0,0;") << "nothing holds the file";
+    }
     ASSERT_EQ(Answer(connection_->Begin(TransactionMode::read_write)), 0);
     const Kept inside = Plain();
     EXPECT_EQ(Write(*inside, 0, "x"), 22920);
