@@ -79,7 +79,6 @@ void Branches::StartClock(Branch& branch) {
 
 void Branches::Release(const BranchPointer& held, Rest rest) noexcept {
     const std::lock_guard lock(mutex_);
-    if (rest == Rest::prepared && held->rest != Rest::prepared) --held->work->branches;
     held->rest = rest;
     held->work->held = false;
     try {
@@ -93,7 +92,7 @@ void Branches::Remove(const BranchPointer& held, int doom_of_others) noexcept {
     const std::lock_guard lock(mutex_);
     branches_.remove(held);
     held->work->held = false;
-    if (held->rest != Rest::prepared) --held->work->branches;
+    --held->work->branches;
     if (doom_of_others != 0) held->work->doom = doom_of_others;
     changed_.notify_all();
 }

@@ -32,7 +32,7 @@ struct Work {
     bool began = false;     // the engine's transaction was seen
     bool held = false;      // of the list, as is the next
     std::thread::id holder; // when held: who waits for himself need not
-    std::uint32_t branches = 1;    // that are not finished or prepared
+    std::uint32_t branches = 1;    // that are not finished
     // Why it is to be rolled back, which the next call answers: its work is lost, or was given up. 0: it is not.
     int doom = 0;
 };
