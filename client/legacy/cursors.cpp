@@ -158,7 +158,6 @@ int FetchRows(Cursor& cursor, Cda_Def& area, sword rows) {
 // Fetches into the elements and ends, whether or not there are more rows.
 int FetchExactly(Cursor& cursor, Cda_Def& area, ub4 rows) {
     cursor.rows = cursor.rows_before = 0;
-    area.rpc = 0;
     if (cursor.waits == Cursor::Waits::no) {
         ForgetRow(cursor);
         if (const int failed = Compile(cursor)) {

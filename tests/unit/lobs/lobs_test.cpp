@@ -124,6 +124,7 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
         auto& self = *static_cast<decltype(this)>(context);
         ub4 length = 0;
         EXPECT_EQ(self.Answer(OCILobGetLength(self.svc, self.err, self.lob, &length)), 24820);
+        EXPECT_EQ(self.Read(self.lob), "!24804");
         OCIStmt* made = nullptr;
         std::thread([&] {
             EXPECT_EQ(OCIHandleFree(self.New<OCIStmt>(OCI_HTYPE_STMT), OCI_HTYPE_STMT), OCI_SUCCESS);
@@ -135,6 +136,15 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
         return OCI_CONTINUE;
     };
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 4, this, asks, 0, 0)), 0);
+    const auto breaks = [](dvoid* context, const dvoid*, ub4, ub1) -> sb4 {
+        auto& self = *static_cast<decltype(this)>(context);
+        EXPECT_EQ(OCIBreak(self.svc, self.err), OCI_SUCCESS);
+        return OCI_CONTINUE;
+    };
+    Temporary(other);
+    EXPECT_EQ(Write(other, 1, "12345"), 0);
+    EXPECT_EQ(Answer(OCILobRead(svc, err, other, &(amount = 0), 1, room, 4, this, breaks, 0, 0)), 1013);
+    MUST(Answer(OCIReset(svc, err)));
     const auto leaves = [](dvoid* context, dvoid*, ub4* length, ub1* piece) -> sb4 {
         auto& self = *static_cast<decltype(this)>(context);
         EXPECT_EQ(OCILogoff(self.svc, self.err), OCI_SUCCESS);
@@ -226,6 +236,12 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     oraub8 two = 2;
     SHOULD(Answer(OCILobWrite2(svc, err, lob, nullptr, &two, 1, room, 5, 0, nullptr, nullptr, 0, 0)));
     EXPECT_EQ(two, 2u) << "in characters";
+    Temporary(other);
+    MUST(Answer(OCILobEnableBuffering(svc, err, other)));
+    EXPECT_EQ(Write(other, 1, std::string(512 << 10, 'x')), 0);
+    EXPECT_EQ(Write(other, (512 << 10) + 1, "x"), 22280) << "no more than that waits";
+    MUST(Answer(OCILobDisableBuffering(svc, err, other)));
+    EXPECT_EQ(LengthOf(other), 512u << 10);
 }
 
 // What goes in pieces holds the session's other calls up, until it is finished or its locator is gone.

@@ -79,6 +79,8 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     for (Lda_Def* area : {&unknown, &cda})
         for (auto* call : {ologof, ocom, orol, ocon, ocof, obreak, onbset, onbclr, onbtst}) EXPECT_EQ(call(area), 1001);
     EXPECT_EQ(std::memcmp(&before, &unknown, sizeof unknown), 0);
+    EXPECT_EQ(oopen(&lda, &lda, nullptr, -1, -1, nullptr, -1), 1001);
+    EXPECT_EQ(LogOn(user, database), 1015);
     EXPECT_EQ(oopen(&unknown, &cda, nullptr, -1, -1, nullptr, -1), 1001);    // a maker: clears, and leaves rc
     EXPECT_EQ(std::make_tuple(unknown.rc, unknown.ose), std::make_tuple(1001, 0));
 }
@@ -152,6 +154,9 @@ TEST_F(LegacyCalls, LocksAreWaitedFor) {
     for (Login* login : {&holding, &waiting}) MUST(login->LogOn(user, database), login->Open());
     ASSERT_EQ(server ? 0 : waiting.Run("create table t (n integer, c varchar2(10))"), 0);
     MUST(waiting.Run("insert into t values (1, 'a')"), ocom(&waiting.lda), holding.Run("update t set c = 'b'"));
+    MUST(oopt(&waiting.cda, 2, 4));
+    EXPECT_EQ(waiting.Run("update t set c = 'c' where n = 1"), 54) << "not where that is not wished for, and there alone";
+    MUST(oopt(&waiting.cda, 2, 0));
     std::thread releasing([&] {
         std::this_thread::sleep_for(200ms);
         EXPECT_EQ(ocom(&holding.lda), 0);
@@ -223,6 +228,9 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
     EXPECT_EQ(cda.rpc, 2u);
     ASSERT_EQ(Parse("select 1 / 0 from t"), 0);
     EXPECT_EQ(Finish([&] { return oexec(&cda); }), 1476);
+    ASSERT_EQ(Parse("select n,  x from t"), 0);
+    EXPECT_EQ(Finish([&] { return oexec(&cda); }), 904);
+    EXPECT_EQ(cda.peo, 11);
     // A login whose connection is lost with its work ends all the same.
     ASSERT_EQ(Parse("delete from t where pg_terminate_backend(pg_backend_pid())"), 0);
     EXPECT_EQ(Finish([&] { return oexec(&cda); }), 3113);

@@ -135,6 +135,14 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
          set(padded, OCI_HTYPE_DEFINE, OCI_ATTR_CHARSET_ID, ub2{2000}), calls.Execute());
     EXPECT_EQ(std::string_view(area, 8), std::string_view("\0\xe9\0 \0 \0 ", 8));
     EXPECT_EQ(calls.ColumnName(calls.Column(1)), "\xe4");
+    auto* const lob = calls.NewDescriptor<OCILobLocator>(OCI_DTYPE_LOB);
+    ub4 amount = 0;
+    area[0] = '\xc4';
+    MUST(OCILobCreateTemporary(svc, err_, lob, 0, SQLCS_NCHAR, OCI_TEMP_NCLOB, FALSE, OCI_DURATION_SESSION),
+         OCILobWrite(svc, err_, lob, &amount, 1, area, 1, OCI_ONE_PIECE, nullptr, nullptr, 171, SQLCS_NCHAR));
+    for (const ub1 form : {SQLCS_NCHAR, SQLCS_IMPLICIT})
+        EXPECT_EQ(OCILobRead(svc, err_, lob, &(amount = 0), 1, area + form, 1, nullptr, nullptr, 0, form), OCI_SUCCESS);
+    EXPECT_EQ(std::string_view(area, 3), "\xc4?\xc4");
     // Bytes that are no text.
     EXPECT_EQ(calls.Prepare("select '\x81' from dual"), 24501);
     EXPECT_EQ(calls.Prepare({"select 1 from dual\0\x81", 20}), 0) << "it ends at its zero";
