@@ -183,12 +183,13 @@ Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint
     if (Status status = FindValueTargets(database, sql, HasIntervals(), made.targets); status.Failed()) return status;
     if (utf8_) made.objects = FindObjectTargets(database, made.targets, lobs_);
     if (utf8_) made.lobs = FindLobItems(database, made.statement.get(), sql, lobs_, made.targets);
+    const bool keeps = KeepReturned(database, made.statement.get(), sql, made.targets);
     const std::string rewritten = made.targets.Rewritten(sql);
     if (rewritten.empty()) return {};
     StatementHandle checked = CompileText(rewritten, code, nullptr);
     if (code != SQLITE_OK) return Failure(database, code);
     std::swap(made.statement, checked);
-    if (!made.lobs.empty()) made.as_written = std::move(checked);
+    if (!made.lobs.empty() || keeps) made.as_written = std::move(checked);
     return {};
 }
 

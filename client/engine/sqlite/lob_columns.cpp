@@ -126,6 +126,14 @@ private:
     std::size_t index_ = 0;
 };
 
+// By SQLite's rules for the words of a declared type.
+bool HasRealAffinity(const std::string& declared) {
+    const std::string words = UpperCase(declared);
+    const auto has = [&](const char* part) { return words.find(part) != std::string::npos; };
+    const bool is_other = has("INT") || has("CHAR") || has("CLOB") || has("TEXT") || has("BLOB");
+    return !is_other && (has("REAL") || has("FLOA") || has("DOUB"));
+}
+
 // SQLite tells the declared types of a select list, not of what a change returns.
 bool MayHaveLobs(sqlite3_stmt* compiled, bool is_query) {
     const int count = sqlite3_column_count(compiled);
@@ -151,6 +159,24 @@ std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std
     if (!rewriter.Rewrite(static_cast<std::size_t>(sqlite3_column_count(compiled))) || rewriter.items.empty()) return {};
     targets.edits.insert(targets.edits.end(), rewriter.edits.begin(), rewriter.edits.end());
     return std::move(rewriter.items);
+}
+
+bool KeepReturned(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, ValueTargets& targets) {
+    if (sqlite3_stmt_readonly(compiled) != 0 || sqlite3_column_count(compiled) == 0) return false;
+    const PieceList pieces = Split(sql);
+    const std::optional<ListOfTable> read = ReadReturning(pieces);
+    const std::vector<TableColumn> columns = read ? AllColumns(database, read->table) : std::vector<TableColumn>();
+    if (columns.empty() || !HasRealAffinity(columns.front().declared)) return false;
+    std::string all;
+    for (const TableColumn& column : columns) all += (all.empty() ? "+" : ", +") + Quoted(column.name);
+    for (std::size_t at = read->list.first; at < read->list.last; at = FindPiece(pieces, at, {","}) + 1) {
+        const auto begin = static_cast<std::size_t>(pieces[at].data() - sql.data());
+        const bool is_all = pieces[at] == "*";
+        const bool is_lob = std::any_of(targets.edits.begin(), targets.edits.end(),
+                                        [&](const ValueTargets::Edit& edit) { return edit.replaces && edit.begin == begin; });
+        if (!is_lob) targets.edits.push_back({begin, begin + pieces[at].size(), is_all ? all : "+", {}, is_all});
+    }
+    return true;
 }
 
 }  // namespace engine::sqlite

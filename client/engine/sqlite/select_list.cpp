@@ -118,6 +118,17 @@ SelectItem ReadItem(std::string_view text) {
     return item;
 }
 
+// Goes on to what a change returns; false when it returns nothing.
+bool PassReturning(Pieces& pieces) {
+    int depth = 0;
+    for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
+        if (piece == "(") ++depth;
+        if (piece == ")") --depth;
+        if (depth == 0 && IsWord(piece, "returning")) return true;
+    }
+    return false;
+}
+
 bool EndsList(std::string_view piece) {
     constexpr std::array<std::string_view, 9> kClauses = {"from", "where", "union", "order", "limit", "group",
                                                           "except", "intersect", "window"};
@@ -152,7 +163,11 @@ std::vector<SelectItem> ReadSelectList(std::string_view sql) {
     Pieces pieces(sql);
     const std::string_view verb = pieces.Next();
     const bool is_values = IsWord(verb, "values");
-    if (!is_values && !IsWord(verb, "select")) return {};
+    if (IsWord(verb, "insert") || IsWord(verb, "update") || IsWord(verb, "delete") || IsWord(verb, "replace")) {
+        if (!PassReturning(pieces)) return {};
+    } else if (!is_values && !IsWord(verb, "select")) {
+        return {};
+    }
     if (is_values) pieces.Next();    // the parenthesis
     std::vector<SelectItem> items;
     std::size_t begin = pieces.At();

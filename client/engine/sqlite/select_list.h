@@ -14,7 +14,7 @@ struct SelectItem {
     std::string type;    // as a declaration, of an expression whose text tells it; or empty
 };
 
-// One item a column; none when the text is no query whose list can be told, as with "*".
+// One item a column, of what a change returns, too; none when the text has no list that can be told, as with "*".
 std::vector<SelectItem> ReadSelectList(std::string_view sql);
 
 // What an expression answers: the type as a declaration, or the argument whose type it has, as trunc(hired) has that of
