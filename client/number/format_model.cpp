@@ -112,7 +112,7 @@ private:
     }
 
     bool EndSign(Sign sign) {
-        if (model_.sign != Sign::before || Places() == 0) return false;
+        if (model_.sign != Sign::before) return false;
         model_.sign = sign;
         ended_ = true;
         return true;

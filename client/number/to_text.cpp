@@ -53,7 +53,7 @@ void PutSignBefore(const Job& job, Writer* out) {
             break;
         case FormatModel::Sign::leading_s: out->Put(negative ? '-' : '+'); break;
         case FormatModel::Sign::brackets:
-            if (negative || job.model.fill) out->Put(negative ? '<' : ' ');
+            if (negative) out->Put('<');
             break;
         default: break;
     }
