@@ -163,7 +163,10 @@ std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std
 
 bool KeepReturned(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, ValueTargets& targets) {
     if (sqlite3_stmt_readonly(compiled) != 0 || sqlite3_column_count(compiled) == 0) return false;
-    const PieceList pieces = Split(sql);
+    PieceList pieces = Split(sql);
+    const bool with = !pieces.empty() && IsWord(pieces[0], "with");
+    const std::size_t verb = with ? FindPiece(pieces, 0, {"insert", "update", "delete", "replace"}) : 0;
+    pieces.erase(pieces.begin(), pieces.begin() + static_cast<std::ptrdiff_t>(verb));
     const std::optional<ListOfTable> read = ReadReturning(pieces);
     const std::vector<TableColumn> columns = read ? AllColumns(database, read->table) : std::vector<TableColumn>();
     if (columns.empty() || !HasRealAffinity(columns.front().declared)) return false;
