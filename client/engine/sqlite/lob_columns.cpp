@@ -50,8 +50,8 @@ namespace {
 
 class Rewriter {
 public:
-    Rewriter(sqlite3* database, std::string_view sql, const PieceList& pieces, ListOfTable read, LobStore& store)
-        : database_(database), sql_(sql), pieces_(pieces), read_(std::move(read)), store_(store) {}
+    Rewriter(sqlite3* database, std::string_view sql, const PieceList& pieces, ListOfTable read, bool is_query, LobStore& store)
+        : database_(database), sql_(sql), pieces_(pieces), read_(std::move(read)), is_query_(is_query), store_(store) {}
 
     // False where the items cannot be told.
     bool Rewrite(std::size_t columns) {
@@ -94,7 +94,7 @@ private:
         for (const TableColumn& column : InsertableColumns(database_, read_.table)) {
             if (!list.empty()) list += ", ";
             const bool is_object = ObjectKindOf(column.column).has_value();
-            list += is_object ? Number(column) : Name() + '.' + Quoted(column.name);
+            list += is_object ? Number(column) : (is_query_ ? "" : "+") + Name() + '.' + Quoted(column.name);
             if (is_object) Note(index_, column);
             ++index_;
         }
@@ -122,6 +122,7 @@ private:
     const std::string_view sql_;
     const PieceList& pieces_;
     ListOfTable read_;
+    const bool is_query_;    // else KeepReturned says why there is a plus
     LobStore& store_;
     std::size_t index_ = 0;
 };
@@ -155,7 +156,7 @@ std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std
     const PieceList pieces = Split(sql);
     const std::optional<ListOfTable> read = is_query ? ReadSelect(pieces) : ReadReturning(pieces);
     if (!read || (is_query && OrdersByNumber(pieces, *read))) return {};
-    Rewriter rewriter(database, sql, pieces, *read, store);
+    Rewriter rewriter(database, sql, pieces, *read, is_query, store);
     if (!rewriter.Rewrite(static_cast<std::size_t>(sqlite3_column_count(compiled))) || rewriter.items.empty()) return {};
     targets.edits.insert(targets.edits.end(), rewriter.edits.begin(), rewriter.edits.end());
     return std::move(rewriter.items);
