@@ -202,7 +202,7 @@ private:
         step.begin = first < last ? Offset(tokens_[first].begin) : 0;
         step.end = first < last ? Offset(tokens_[last - 1].End()) : 0;
         if (run == Run::change || (run == Run::query && result_.is_block)) FindInto(step, first, last);
-        if (run == Run::query) step.locks_rows = EndsInForUpdate(first, last);
+        if (run == Run::query) step.locks_rows = LocksRows(first, last);
         result_.steps.push_back(std::move(step));
     }
 
@@ -234,13 +234,10 @@ private:
         }
     }
 
-    bool EndsInForUpdate(std::size_t first, std::size_t last) const {
-        int depth = 0;
-        for (std::size_t index = first; index + 1 < last; ++index) {
-            if (tokens_[index].Is("(")) ++depth;
-            if (tokens_[index].Is(")")) --depth;
-            if (depth == 0 && tokens_[index].Is("for") && tokens_[index + 1].Is("update")) return true;
-        }
+    // By `for update`, in a subquery too.
+    bool LocksRows(std::size_t first, std::size_t last) const {
+        for (std::size_t index = first; index + 1 < last; ++index)
+            if (tokens_[index].Is("for") && tokens_[index + 1].Is("update")) return true;
         return false;
     }
 

@@ -158,6 +158,8 @@ TEST_F(Dynamic, BlocksAndTables) {
     ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR), OCI_DEFAULT, 4, &(count = 0)), 0);
     MUST(Answer(OCIBindDynamic(binds_[1], err, &elements, Callback::In, &selected, Callback::Out)), Execute());
     EXPECT_EQ(selected.Flush(), "p|q|r|s|");
+    ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR), OCI_DEFAULT, 4, &count), 0);
+    EXPECT_EQ(ExecuteCode(), OCI_NEED_DATA) << "bound anew it has no callbacks";
 }
 
 // What a callback must not answer, in either direction; a place is not looked at where the value is null.

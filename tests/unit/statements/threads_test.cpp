@@ -100,9 +100,11 @@ TEST_F(Threads, StatementsMoveBetweenSessions) {
         Note(block.Ready("begin open :c for select 2 from dual; end;", {{&target, 8, SQLT_CUR}}));
         for (int round = 0; round < 300; ++round) {
             own.svc = block.svc = (round + thread) % 2 ? svc : second;
-            target = shared[(round / 2 + thread) % 2];
             Note(own.Execute(0));
-            Note(block.Execute());
+            for (const int of : {thread, thread + 1}) {    // the second may be of the session that the block is not on
+                target = shared[(round / 2 + of) % 2];
+                Note(block.Execute());
+            }
         }
     };
     AtOnce(2, work);
