@@ -101,7 +101,8 @@ private:
                 const std::size_t open = span.first - 1;
                 const std::string_view function = Before(open);
                 if (!IsPlainName(function)) {
-                    if (IsOneOf(function, {"in", "values", "using", "over"})) return InList(span, open);
+                    const bool is_row = function == "," && IsWord(At(Clause(open)), "values");
+                    if (is_row || IsOneOf(function, {"in", "values", "using", "over"})) return InList(span, open);
                     span = {open, span.last + 1};
                 } else if (IsOneOf(function, {"min", "max"})) {
                     span = {open - 1, span.last + 1};
