@@ -12,7 +12,8 @@ namespace {
 
 constexpr std::size_t kBlock = std::size_t{1} << 18;
 
-// ?1: the table, ?2: its schema. Words that only look like a check keep the values in memory, which is harmless.
+// ?1: the table, ?2: its schema, ?3: the column. Words that only look like a check keep the values in memory, which is
+// harmless. A column that is part of an index or refers to others must have its value when its row is written.
 constexpr std::string_view kWatchers =
     "select exists(select 1 from main.sqlite_schema where type = 'trigger' and tbl_name = ?1 collate nocase"
     " union all select 1 from temp.sqlite_schema where type = 'trigger' and tbl_name = ?1 collate nocase"
@@ -20,7 +21,10 @@ constexpr std::string_view kWatchers =
     " union all select 1 from temp.sqlite_schema where type = 'index' and tbl_name = ?1 collate nocase and sql like '%where%'"
     " union all select 1 from main.sqlite_schema where type = 'table' and name = ?1 collate nocase and sql like '%check%'"
     " union all select 1 from temp.sqlite_schema where type = 'table' and name = ?1 collate nocase and sql like '%check%'"
-    " union all select 1 from pragma_table_xinfo(?1, ?2) where hidden in (2, 3))";
+    " union all select 1 from pragma_table_xinfo(?1, ?2) where hidden in (2, 3)"
+    " union all select 1 from pragma_index_list(?1, ?2) l, pragma_index_xinfo(l.name, ?2) i"
+    " where i.key and coalesce(i.name, ?3) = ?3 collate nocase"
+    " union all select 1 from pragma_foreign_key_list(?1, ?2) where \"from\" = ?3 collate nocase)";
 
 }  // namespace
 
@@ -47,18 +51,21 @@ const ObjectTarget* ObjectValues::FindTarget(std::size_t parameter, const Lob& l
 Status ObjectValues::TableAllows(bool& allows) {
     if (!allows_) {
         const SqliteConnection::Trusted trusted(connection_);
-        const LobColumn& column = *targets_.front().column;
         sqlite3_stmt* compiled = nullptr;
         int code = sqlite3_prepare_v2(connection_.Database(), kWatchers.data(), static_cast<int>(kWatchers.size()),
                                       &compiled, nullptr);
         const StatementHandle statement(compiled);
-        if (code == SQLITE_OK) {
+        bool watched = false;
+        for (std::size_t index = 0; index < targets_.size() && code == SQLITE_OK && !watched; ++index) {
+            const LobColumn& column = *targets_[index].column;
             sqlite3_bind_text(compiled, 1, column.table.c_str(), -1, SQLITE_STATIC);
             sqlite3_bind_text(compiled, 2, column.schema.c_str(), -1, SQLITE_STATIC);
-            code = sqlite3_step(compiled);
+            sqlite3_bind_text(compiled, 3, column.name.c_str(), -1, SQLITE_STATIC);
+            if (sqlite3_step(compiled) == SQLITE_ROW) watched = sqlite3_column_int(compiled, 0) != 0;
+            code = sqlite3_reset(compiled);
         }
-        if (code != SQLITE_ROW) return Failure(connection_.Database(), code);
-        allows_ = sqlite3_column_int(compiled, 0) == 0;
+        if (code != SQLITE_OK) return Failure(connection_.Database(), code);
+        allows_ = !watched;
     }
     allows = *allows_;
     return {};
