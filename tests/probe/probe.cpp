@@ -60,6 +60,8 @@ struct Installed {
     OCICallbackDefine define = nullptr;
     OCICallbackLobRead read = nullptr;
     OCICallbackLobWrite write = nullptr;
+    OCIThreadStartFunction start = nullptr;
+    void* started_with = nullptr;
 };
 
 // One argument as the call passed it.
@@ -70,7 +72,7 @@ struct Argument {
 };
 
 struct State {
-    std::mutex mutex;
+    std::recursive_mutex mutex;    // a routine that is called back calls, too
     std::map<std::string, std::deque<Answer>> answers;
     bool in_turns = false;
     std::map<const void*, size_t> objects;
@@ -328,6 +330,7 @@ void CallBack(State& state, const Words& words) {
     else if ((kind == "out" && installed.out) || (kind == "define" && installed.define)) CallOut(state, words);
     else if (kind == "read" && installed.read) CallRead(state, words);
     else if (kind == "write" && installed.write) CallWrite(state, words);
+    else if (kind == "start" && installed.start) installed.start(installed.started_with);
     else Print(state, "    probe: no " + kind + " callback\n");
 }
 
@@ -361,6 +364,12 @@ void Install(State& state, Cda_Def*, ub1 opcode, sword, ub1* context, sb4, sword
 void Install(State& state, Cda_Def*, ub1 opcode, text*, sb4, ub1* context, sb4, sword, sword, sb2*, ub2*, ub2*, sb4,
              sb4, sb4, sb4, ub4, ub4*, text*, sb4, sword) {
     if (opcode == 0) state.installed.piece_context = context;
+}
+
+// A thread's routine: call:start runs it at once, and its calls are recorded behind the one that was given it.
+void Install(State& state, void*, OCIError*, OCIThreadStartFunction start, void* with, OCIThreadId*, OCIThreadHandle*) {
+    state.installed.start = start;
+    state.installed.started_with = with;
 }
 
 void* MakeObject(State& state) {
