@@ -228,7 +228,7 @@ struct TypeRow {
 };
 
 constexpr std::uint32_t kNumberSize = 22, kDateSize = 7, kTimestampSize = 11, kZonedSize = 13, kRowIdSize = 18;
-constexpr Oid kChar = 18, kName = 19, kJson = 114, kXml = 142, kUnknown = 705, kFixed = 1042, kVarying = 1043;
+constexpr Oid kChar = 18, kName = 19, kJson = 114, kXml = 142, kFixed = 1042, kVarying = 1043;
 
 constexpr TypeRow kTypes[] = {
     {oid::kBool, ReadBool, TextToBool, SQLT_NUM, kNumberSize, 1, 0},
@@ -245,7 +245,6 @@ constexpr TypeRow kTypes[] = {
     {kXml, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
     {oid::kFloat4, ReadFloat, TextToReal, SQLT_IBFLOAT, 4, 0, 0},
     {oid::kFloat8, ReadDouble, TextToReal, SQLT_IBDOUBLE, 8, 0, 0},
-    {kUnknown, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
     {kFixed, ReadText, ReadText, SQLT_AFC, 0, 0, 0},
     {kVarying, ReadText, ReadText, SQLT_CHR, 0, 0, 0},
     {oid::kDate, ReadDay, TextToDate, SQLT_DAT, kDateSize, 0, 0},
@@ -396,7 +395,7 @@ Reader WholeTextReader(Oid type) {
 }
 
 bool IsTextType(Oid type) {
-    return type == oid::kText || type == kVarying || type == kFixed || type == kName || type == kUnknown;
+    return type == oid::kText || type == kVarying || type == kFixed || type == kName;
 }
 
 // ---- Writing
