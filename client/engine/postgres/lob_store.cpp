@@ -303,7 +303,7 @@ Status PgLobStore::WhyMissing(const RowVersion& version) {
     Status status = connection_.AskGuarded("select 1 from only " + table->name +
                                                " where ctid = (select pg_catalog.currtid2($1::text, $2::tid))",
                                            question.values, found);
-    if (connection_.Broken() || IsPassing(status)) return status;
+    if (connection_.Server().Broken() || IsPassing(status)) return status;
     return Refused(status.Ok() && PQntuples(found.get()) > 0 ? errors::kSnapshotTooOld : errors::kNoLobValue);
 }
 
@@ -323,7 +323,7 @@ Status PgLobStore::FindLatest(const LobColumn& column, const LobRow& row, bool f
         " where ctid = any(array(select place from kelp_v union select pg_catalog.currtid2($2::text, place) from kelp_v))";
     Result found;
     Status status = connection_.AskGuarded(sql, question.values, found);
-    const bool says_why = connection_.Broken() || !connection_.InTransaction() || IsPassing(status);
+    const bool says_why = connection_.Server().Broken() || !connection_.InTransaction() || IsPassing(status);
     if (!status.Ok()) return says_why ? status : Refused(errors::kNoLobValue);
     int fits = -1, next = -1;
     for (int index = 0; index < PQntuples(found.get()); ++index) {

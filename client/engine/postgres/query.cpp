@@ -102,7 +102,7 @@ Status PgQuery::Prepare(std::uint32_t& error_offset) {
     if (savepoint_.verb != PgConnection::SavepointCommand::Verb::none) return {};
     const bool within = connection_.InTransaction();
     Status status = PrepareText(error_offset);
-    const bool lost = within && !connection_.InTransaction() && !connection_.Broken();
+    const bool lost = within && !connection_.InTransaction() && !connection_.Server().Broken();
     return lost && !connection_.Loss().Ok() ? connection_.Loss() : status;
 }
 
@@ -110,7 +110,7 @@ Status PgQuery::Prepare(std::uint32_t& error_offset) {
 Status PgQuery::PrepareText(std::uint32_t& error_offset) {
     tail_ = InsertsRows() ? kReturningRow : std::string_view();
     Status status = PrepareTyped(error_offset);
-    if (!tail_.empty() && !status.Ok() && !connection_.Broken()) {
+    if (!tail_.empty() && !status.Ok() && !connection_.Server().Broken()) {
         tail_ = {};
         status = PrepareTyped(error_offset);
     }
@@ -126,7 +126,7 @@ Status PgQuery::PrepareLobs() {
     std::string name = connection_.NewName();
     const auto fields = static_cast<int>(columns_.size() + lobs_.size() + kFieldsOfPlace);
     Status status = text.empty() ? Refused(errors::kUnsupported) : SendPrepared(name, text, bound_.Types(), description, offset);
-    if (connection_.Broken() || IsPassing(status)) return status;
+    if (connection_.Server().Broken() || IsPassing(status)) return status;
     has_places_ = status.Ok() && PQnfields(description.get()) == fields;
     if (has_places_) connection_.Forget(std::exchange(name_, std::move(name)));
     else if (status.Ok()) connection_.Forget(name);
@@ -146,7 +146,7 @@ Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
     text_ = sql_;
     makes_object_.clear();
     Status status = PrepareForObjects(PrepareAs(types, error_offset), error_offset);
-    if (connection_.Broken()) return status;
+    if (connection_.Server().Broken()) return status;
     if (status.Number() == errors::kInconsistentTypes) {    // a type that nothing tells
         std::vector<Oid> told = types;
         for (std::size_t index = 0; index < told.size(); ++index) {
@@ -250,7 +250,7 @@ Status PgQuery::DescribeColumns(const PGresult* result) {
 
 // The tables are others than they were, or somebody has thrown the server's statements away.
 bool PgQuery::IsStale(const Status& status) const {
-    return (status.Number() == errors::kSchemaChanged || status.Number() == 1003) && !connection_.Broken();
+    return (status.Number() == errors::kSchemaChanged || status.Number() == 1003) && !connection_.Server().Broken();
 }
 
 Status PgQuery::PrepareAnew() {
@@ -335,6 +335,7 @@ Status PgQuery::ExecuteSavepoint(ArrayOutcome& outcome) {
 // after the other make batches small. A stop holds for the row that it was met at; those before it are done.
 Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) {
     const bool delivers = run.returned && !columns_.empty();
+    Wire& server = connection_.Server();
     std::uint32_t size = kLargestBatch;
     std::uint32_t stop = run.last;
     std::uint32_t singly = run.first;    // rows below go one by one
@@ -344,12 +345,12 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
         Batch batch;
         const bool whole = row >= singly && row < stop && !delivers && stop == run.last && PrepareWhole(run.last - row);
-        if (was_in_transaction && !connection_.InTransaction()) return connection_.Broken() ? connection_.Server().Lost() : connection_.Loss();
+        if (was_in_transaction && !connection_.InTransaction()) return server.Broken() ? server.Lost() : connection_.Loss();
         if (whole) {
             batch = TryWhole(source, row, run.last);
             singly = row + std::max(batch.sent, 1U);
             if (batch.refusal.Number() == errors::kCancelled) stop = singly;
-            if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !connection_.Broken()) continue;
+            if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !server.Broken()) continue;
         } else if (row == stop) batch.refusal = PgConnection::Stopped();
         else if (delivers) batch = RunReturning(source, row, last, stop == run.last, *run.returned);
         else batch = RunBatch(source, row, last, stop == run.last);
@@ -371,7 +372,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         size = failure.Ok() ? std::min(2 * size, kLargestBatch) : std::max(size / 8, 1U);
         if (failure.Ok()) failure = std::move(batch.refusal);
         if (failure.Ok()) continue;
-        const auto is_lost = [&] { return connection_.Broken() || (was_in_transaction && !connection_.InTransaction()); };
+        const auto is_lost = [&] { return server.Broken() || (was_in_transaction && !connection_.InTransaction()); };
         if (!is_lost() && !std::exchange(renewed, renewed || IsStale(failure)) && Renews(failure)) continue;
         if (is_lost()) return failure;
         const bool stops = !run.all_rows || failure.Number() == errors::kCancelled;

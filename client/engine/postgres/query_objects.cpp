@@ -88,7 +88,7 @@ Status PgQuery::PrepareForTexts(std::vector<Oid> types, std::uint32_t& error_off
     Result description;
     std::uint32_t offset = 0;
     if (Status told = SendPrepared(name, text_, asked, description, offset); !told.Ok())
-        return connection_.Broken() || IsPassing(told) ? told : Status();
+        return connection_.Server().Broken() || IsPassing(told) ? told : Status();
     connection_.Forget(name);
     bool any = false;
     for (const std::size_t index : alone) {
@@ -115,7 +115,7 @@ Status PgQuery::PrepareForObjects(Status status, std::uint32_t& error_offset) {
     const bool misfits = status.Ok() ? GivesTextsToObjects() : status.Number() == errors::kInconsistentTypes;
     if (effect_ != Effect::changes || !misfits || QuotesOtherwise(sql_)) return status;
     bool found = false;
-    if (Status asked = FindObjects(found); connection_.Broken() || IsPassing(asked)) return asked;
+    if (Status asked = FindObjects(found); connection_.Server().Broken() || IsPassing(asked)) return asked;
     return found ? PrepareAs(DeclaredTypes(), error_offset) : status;
 }
 

@@ -78,7 +78,7 @@ Status PgQuery::Finish(Status status) noexcept {
 }
 
 Status PgQuery::CheckOpen() {
-    if (state_ == State::closed && connection_.Broken()) return connection_.Server().Lost();
+    if (state_ == State::closed && connection_.Server().Broken()) return connection_.Server().Lost();
     if (state_ == State::closed) return Refused(errors::kFetchOutOfSequence);
     return connection_.Server().Asked() ? Ended(PgConnection::Stopped()) : Status();
 }

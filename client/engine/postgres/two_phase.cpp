@@ -139,7 +139,7 @@ Status PgConnection::KeepsPrepared(const Xid& xid, bool& kept) {
         if (status.Ok()) return status;
         branch_question_.clear();
         if (in_transaction_) return Lose(status);
-        if (is_new || Broken()) return status;
+        if (is_new || wire_->Broken()) return status;
     }
 }
 

@@ -9,6 +9,7 @@
 
 #include "engine/sqlite/accounts.h"
 #include "engine/sqlite/query.h"
+#include "engine/sqlite/returned_values.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {

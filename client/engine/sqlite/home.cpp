@@ -9,6 +9,7 @@
 
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/functions.h"
+#include "engine/sqlite/table_columns.h"
 #include "handles/errors.h"
 
 namespace engine::sqlite {
@@ -54,12 +55,6 @@ std::string Uri(const std::string& file) {
     return uri;
 }
 
-std::string Quoted(std::string_view name) {
-    std::string quoted = "\"";
-    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
-    return quoted += '"';
-}
-
 // The statements that `sql` makes of what it finds: a verb and a name.
 std::vector<std::string> Made(sqlite3* database, const char* sql) {
     std::vector<std::string> statements;
@@ -68,7 +63,7 @@ std::vector<std::string> Made(sqlite3* database, const char* sql) {
     const StatementHandle statement(compiled);
     const auto column = [&](int index) { return reinterpret_cast<const char*>(sqlite3_column_text(compiled, index)); };
     while (compiled && sqlite3_step(compiled) == SQLITE_ROW) {
-        if (column(0) && column(1)) statements.push_back(column(0) + Quoted(column(1)));
+        if (column(0) && column(1)) statements.push_back(column(0) + QuotedName(column(1)));
     }
     return statements;
 }

@@ -20,12 +20,6 @@ bool OrdersByNumber(const PieceList& pieces, const ListOfTable& read) {
     return std::any_of(pieces.begin() + static_cast<std::ptrdiff_t>(order), pieces.end(), IsNumber);
 }
 
-std::string Quoted(std::string_view name) {
-    std::string quoted = "\"";
-    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
-    return quoted += '"';
-}
-
 }  // namespace
 
 bool FindNumberedTable(sqlite3* database, TableName& table) {
@@ -68,7 +62,7 @@ public:
     std::vector<ValueTargets::Edit> edits;
 
 private:
-    std::string Name() const { return read_.alias.empty() ? Quoted(read_.table.name) : std::string(read_.alias); }
+    std::string Name() const { return read_.alias.empty() ? QuotedName(read_.table.name) : std::string(read_.alias); }
     [[nodiscard]] bool IsTable(std::string_view piece) const {
         const std::string name = PlainName(piece);
         const std::string wanted = read_.alias.empty() ? read_.table.name : PlainName(read_.alias);
@@ -94,7 +88,7 @@ private:
         for (const TableColumn& column : InsertableColumns(database_, read_.table)) {
             if (!list.empty()) list += ", ";
             const bool is_object = ObjectKindOf(column.column).has_value();
-            list += is_object ? Number(column) : (is_query_ ? "" : "+") + Name() + '.' + Quoted(column.name);
+            list += is_object ? Number(column) : (is_query_ ? "" : "+") + Name() + '.' + QuotedName(column.name);
             if (is_object) Note(index_, column);
             ++index_;
         }
@@ -105,7 +99,7 @@ private:
     }
     // What is neither text nor bytes is not read where it lies. Nor are long values that are not very long.
     [[nodiscard]] std::string Number(const TableColumn& column) const {
-        const std::string value = Name() + '.' + Quoted(column.name);
+        const std::string value = Name() + '.' + QuotedName(column.name);
         if (!IsLob(column.column))
             return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) when typeof(" +
                    value + ") = 'blob' and length(" + value + ") > " + std::to_string(kHeldWhole) + " then " + Name() +
@@ -126,14 +120,6 @@ private:
     LobStore& store_;
     std::size_t index_ = 0;
 };
-
-// By SQLite's rules for the words of a declared type.
-bool HasRealAffinity(const std::string& declared) {
-    const std::string words = UpperCase(declared);
-    const auto has = [&](const char* part) { return words.find(part) != std::string::npos; };
-    const bool is_other = has("INT") || has("CHAR") || has("CLOB") || has("TEXT") || has("BLOB");
-    return !is_other && (has("REAL") || has("FLOA") || has("DOUB"));
-}
 
 // SQLite tells the declared types of a select list, not of what a change returns.
 bool MayHaveLobs(sqlite3_stmt* compiled, bool is_query) {
@@ -160,27 +146,6 @@ std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std
     if (!rewriter.Rewrite(static_cast<std::size_t>(sqlite3_column_count(compiled))) || rewriter.items.empty()) return {};
     targets.edits.insert(targets.edits.end(), rewriter.edits.begin(), rewriter.edits.end());
     return std::move(rewriter.items);
-}
-
-bool KeepReturned(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, ValueTargets& targets) {
-    if (sqlite3_stmt_readonly(compiled) != 0 || sqlite3_column_count(compiled) == 0) return false;
-    PieceList pieces = Split(sql);
-    const bool with = !pieces.empty() && IsWord(pieces[0], "with");
-    const std::size_t verb = with ? FindPiece(pieces, 0, {"insert", "update", "delete", "replace"}) : 0;
-    pieces.erase(pieces.begin(), pieces.begin() + static_cast<std::ptrdiff_t>(verb));
-    const std::optional<ListOfTable> read = ReadReturning(pieces);
-    const std::vector<TableColumn> columns = read ? AllColumns(database, read->table) : std::vector<TableColumn>();
-    if (columns.empty() || !HasRealAffinity(columns.front().declared)) return false;
-    std::string all;
-    for (const TableColumn& column : columns) all += (all.empty() ? "+" : ", +") + Quoted(column.name);
-    for (std::size_t at = read->list.first; at < read->list.last; at = FindPiece(pieces, at, {","}) + 1) {
-        const auto begin = static_cast<std::size_t>(pieces[at].data() - sql.data());
-        const bool is_all = pieces[at] == "*";
-        const bool is_lob = std::any_of(targets.edits.begin(), targets.edits.end(),
-                                        [&](const ValueTargets::Edit& edit) { return edit.replaces && edit.begin == begin; });
-        if (!is_lob) targets.edits.push_back({begin, begin + pieces[at].size(), is_all ? all : "+", {}, is_all});
-    }
-    return true;
 }
 
 }  // namespace engine::sqlite

@@ -26,8 +26,4 @@ bool FindNumberedTable(sqlite3* database, TableName& table);
 std::vector<LobItem> FindLobItems(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, LobStore& store,
                                   ValueTargets& targets);
 
-// SQLite makes reals of all columns that a change returns as they are, where the table's first one has reals: keeps them
-// by a plus before each. Whether there is any; what lists the types then is the statement as it was written.
-bool KeepReturned(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, ValueTargets& targets);
-
 }  // namespace engine::sqlite

@@ -58,9 +58,10 @@ private:
 
     bool MayBeNumber(Span span) {
         if (span.Size() == 1 && ParameterOf(operands_.At(span.first)) != kNoParameter) return true;
-        const TableColumn* const column = names_.AnswerOf(span);
-        const std::uint16_t type = column ? column->column.type : 0;
-        if (column) return IsNumberType(type) || type == SQLT_IBFLOAT || type == SQLT_IBDOUBLE;
+        if (const TableColumn* const column = names_.AnswerOf(span)) {
+            const std::uint16_t type = column->column.type;
+            return IsNumberType(type) || type == SQLT_IBFLOAT || type == SQLT_IBDOUBLE;
+        }
         const std::vector<Span> choices = operands_.Choices(span);
         return std::any_of(choices.begin(), choices.end(), [&](Span choice) { return MayBeNumber(operands_.Bare(choice)); });
     }

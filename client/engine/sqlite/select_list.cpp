@@ -163,8 +163,7 @@ std::vector<SelectItem> ReadSelectList(std::string_view sql) {
     Pieces pieces(sql);
     const std::string_view verb = pieces.Next();
     const bool is_values = IsWord(verb, "values");
-    constexpr std::string_view kChanges[] = {"with", "insert", "replace", "update", "delete"};
-    if (std::any_of(std::begin(kChanges), std::end(kChanges), [&](std::string_view word) { return IsWord(verb, word); })) {
+    if (IsOneOf(verb, {"with", "insert", "replace", "update", "delete"})) {
         if (!PassReturning(pieces)) return {};
     } else if (!is_values && !IsWord(verb, "select")) {
         return {};

@@ -109,6 +109,12 @@ std::string UpperCase(std::string text) {
     return text;
 }
 
+std::string QuotedName(std::string_view name) {
+    std::string quoted = "\"";
+    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
+    return quoted += '"';
+}
+
 std::string Literal(std::string_view text) {
     std::string literal = "'";
     for (const char c : text) literal.append(c == '\'' ? 2 : 1, c);

@@ -31,7 +31,8 @@ std::vector<TableColumn> InsertableColumns(sqlite3* database, const TableName& t
 
 std::string UpperCase(std::string text);
 
-// A text as an SQL literal.
+// A text as an SQL literal; a name in double quotes.
 std::string Literal(std::string_view text);
+std::string QuotedName(std::string_view name);
 
 }  // namespace engine::sqlite
