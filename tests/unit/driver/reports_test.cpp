@@ -19,13 +19,6 @@ TEST(Trace, CodesWithoutALine) {
         EXPECT_EQ(Trace(code, 0, "x"), "outputOCI (): unrecognized command!\n") << code;
 }
 
-TEST(Commands, NoWordHidesAnother) {
-    int rows = 0;
-    for (const Command* row = kCommandTable; row->word != nullptr; ++row, ++rows)
-        EXPECT_EQ(FindCommand(row->word), row) << row->word;
-    EXPECT_EQ(rows, 268);
-}
-
 // A command with two handlers, or a handler of no command, would leave one of them without notice.
 TEST(CommandsDeathTest, AHandlerTableHasOnePlaceForEachCommand) {
     static constexpr PlainCommand kTwice[] = {

@@ -76,12 +76,4 @@ TEST_F(Texts, ConvertFromUtf16) {
               "before convertFromUTF16 failed: rc = 1\n");
 }
 
-TEST_F(Texts, WhatIsPassedCanBeReadUpToItsLength) {
-    TextArgument argument;
-    ASSERT_TRUE(argument.Set(Token("scott\0of a longer word"s), 20000, TextArea::four_times));
-    EXPECT_EQ(argument.Text()[19999], 0);
-    EXPECT_STREQ(reinterpret_cast<const char*>(argument.Text()), "scott");
-    EXPECT_STREQ(reinterpret_cast<const char*>(argument.Text()) + 6, "of a longer word");
-}
-
 }  // namespace

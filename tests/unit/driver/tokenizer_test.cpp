@@ -1,36 +1,10 @@
-// The words that a line gives.
-#include <cstring>
-#include <vector>
+// The place that a word of a line is kept in.
+#include <string>
 
 #include "loop/tokenizer.h"
 #include "support/printed.h"
 
 namespace {
-
-using Words = std::vector<std::string>;
-
-struct Tokenized { Words words; std::string printed; };
-
-Tokenized Split(const std::string& line) {
-    static char buffer[kLineSize];
-    std::memset(buffer, 0, sizeof buffer);
-    std::memcpy(buffer, line.c_str(), line.size() + 1);
-    TokenVector tokens;
-    int count = 0;
-    Tokenized result{{}, Printed([&] { count = Tokenize(buffer, buffer, tokens); })};
-    for (int index = 0; index < count; ++index) result.words.push_back(tokens.Words()[index]);
-    return result;
-}
-
-TEST(Tokenizer, ALineThatFillsTheBuffer) {
-    const std::string word(kLineSize - 1, 'x');
-    EXPECT_EQ(Split(word).words, Words{word});
-    std::string quoted = word;
-    quoted[0] = '"';
-    EXPECT_EQ(Split(quoted).words, Words{word.substr(1)});
-    quoted.back() = '"';
-    EXPECT_EQ(Split(quoted).words, Words{word.substr(2)});
-}
 
 TEST(Tokenizer, ASlotKeepsItsBufferForLaterLines) {
     TokenVector tokens;

@@ -69,24 +69,4 @@ TEST(Values, LengthsAreNotFollowedPastTheElement) {
     }
 }
 
-TEST(Values, FreeingABufferGivesBackEveryBlock) {
-    const size_t before = PlatformOutstanding("harnix");
-    MemBuffer buffer{};
-    ASSERT_EQ(AllocateBuffer(buffer, nullptr, {.type = SQLT_STR, .size = 10}, 3), 0);
-    // What dynamic binds and defines attach.
-    buffer.dynamic.previous_lengths = static_cast<uint32_t*>(GetMem(3 * sizeof(uint32_t)));
-    buffer.dynamic.piece_lengths = static_cast<uint32_t*>(GetMem(3 * sizeof(uint32_t)));
-    buffer.dynamic.list = static_cast<MemBuffer**>(GetMem(sizeof(MemBuffer*)));
-    EXPECT_EQ(PlatformOutstanding("harnix"), before + 7);
-    FreeBufferBlocks(buffer);
-    EXPECT_EQ(PlatformOutstanding("harnix"), before);
-    FreeBufferBlocks(buffer);
-    EXPECT_EQ(PlatformOutstanding("harnix"), before) << "a second time there is nothing to free";
-    buffer.dynamic.lengths_count = 1;    // as a dynamic define leaves it
-    ASSERT_EQ(AllocateBuffer(buffer, nullptr, {.type = SQLT_STR, .size = 10}, 3), 0);
-    *buffer.Length(0) = 5;
-    EXPECT_EQ(LengthOf(buffer, 0), 5u) << "a buffer in its slot has none of it";
-    FreeBufferBlocks(buffer);
-}
-
 }  // namespace

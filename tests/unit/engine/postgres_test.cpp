@@ -1,4 +1,4 @@
-// What the PostgreSQL engine does in its own way: servers that cannot be reached or go away, deadlocks, cursors, notices,
+// What the PostgreSQL engine does in its own way: servers that cannot be reached or go away, cursors, notices,
 // what the server says as published numbers.
 #include <sys/socket.h>
 #include <sys/time.h>
@@ -106,28 +106,6 @@ TEST_F(Postgres, ServerThatCannotBeReached) {
     close(listener);
 }
 
-// A schema that was asked for within a transaction outlives what is undone of it, and goes with the session.
-TEST_F(Postgres, SchemaIsTheSessionsOwn) {
-    for (const char* sql : {"create schema s", "create table t(n integer)", "create table s.t(n integer)"})
-        ASSERT_EQ(Run(sql), 0) << sql;
-    MustCommit("insert into s.t values(7)");
-    ASSERT_EQ(Answer(connection_->SetMark()), 0);
-    std::string schema = "s";
-    ASSERT_EQ(Answer(connection_->UseSchema(schema)), 0);
-    EXPECT_EQ(Query("select n from t"), "7;");
-    ASSERT_EQ(Answer(connection_->UndoToMark()), 0);
-    EXPECT_EQ(Query("select n from t"), "7;");
-    ASSERT_EQ(Answer(connection_->Rollback()), 0);
-    EXPECT_EQ(Query("select n from t"), "7;");
-    std::unique_ptr<engine::Connection> other;
-    ASSERT_EQ(Answer(connection_->Another(stop_, other)), 0);
-    EXPECT_EQ(Query(*other, "select n from t"), "");
-    other->PreferSchemaOf(connection_.get());
-    EXPECT_EQ(Query(*other, "select n from t"), "7;");
-    other->PreferSchemaOf(nullptr);
-    EXPECT_EQ(Query(*other, "select n from t"), "");
-}
-
 // At each call: 3113 first, 3114 then, whatever was open; and a new logon works.
 TEST_F(Postgres, ServerThatGoesAway) {
     MustCommit("create table t(n integer)", "insert into t select generate_series(1, 3000)");
@@ -190,19 +168,6 @@ TEST_F(Postgres, StopIsHeededBehindSignals) {
     EXPECT_EQ(Answer(connection_->Commit()), 0) << "what ends a transaction is not disturbed";
     EXPECT_TRUE(stop_->Take());
     EXPECT_EQ(Query("select n from slow"), "1;");
-}
-
-TEST_F(Postgres, DeadlockUndoesOneStatement) {
-    MustCommit("create table t(n integer, a integer)", "insert into t values(1, 0), (2, 0)");
-    const auto other = Connect(std::make_shared<engine::StopRequest>());
-    MUST(Run("update t set a = 1 where n = 1"), Run(*other, "update t set a = 2 where n = 2"));
-    int theirs = 0;
-    std::thread waiting([&] { theirs = Run(*other, "update t set a = 2 where n = 1"); });
-    const int ours = Run("update t set a = 1 where n = 2");
-    waiting.join();
-    EXPECT_TRUE((ours == 60 && theirs == 54) || (ours == 54 && theirs == 60) || (ours == 60) != (theirs == 60))
-        << ours << ' ' << theirs;
-    EXPECT_TRUE(connection_->InTransaction() && other->InTransaction()) << "what was done before stays";
 }
 
 TEST_F(Postgres, CursorsAndNotices) {
@@ -284,19 +249,6 @@ TEST_F(Postgres, NamesThatAreNoneAreRefused) {
         EXPECT_EQ(Answer(connection_->Describe("\xFF", kind, object)), 911);
     EXPECT_EQ(Answer(connection_->UseSchema(schema)), 911);
     EXPECT_EQ(Run("savepoint \"A\"") + Run("rollback to a") + Run("rollback to \"A\""), 1086);
-}
-
-// What the end of a transaction runs has something to say, and loses the server.
-TEST_F(Postgres, DeferredTriggersRunAtTheEnd) {
-    MustCommit("create table u(n integer)", "create function f() returns trigger language plpgsql as $$ begin raise notice 'last';"
-               " if new.n = 2 then perform pg_terminate_backend(pg_backend_pid()); end if; return null; end $$",
-               "create constraint trigger g after insert on u deferrable initially deferred for each row execute function f()");
-    MustCommit("insert into u values(1)");
-    const auto notices = connection_->TakeNotices();
-    EXPECT_TRUE(notices.size() == 1 && notices[0].Detail() == "last");
-    MustRun("insert into u values(2)");
-    for (const int lost : {3113, 3114}) EXPECT_EQ(Answer(connection_->Commit()), lost);
-    EXPECT_FALSE(connection_->InTransaction());
 }
 
 // Of placeholders alone, in forms that the server's arrays have. A trigger counts the statements that come.

@@ -45,20 +45,6 @@ TEST_F(Sqlite, WhatOtherProgramsWroteIsRead) {
               "x,soon,x  ,time 2024-02-29 01:02:03.5 +01:00,+000000020 00:00:00.500000000,null;null,5,null,null,null,5;");
 }
 
-TEST_F(Sqlite, BoundMomentsAreWrittenAsTheirColumnsAre) {
-    ASSERT_EQ(Run("create table t(d date, s timestamp(3), z timestamp_tz, v varchar2(40))"), 0);
-    const date::DateTime zoned{.year = 2024, .month = 2, .day = 29, .hour = 1, .minute = 2, .second = 3, .has_zone = true,
-                               .zone_minutes = 90, .nanosecond = 523456789};
-    ASSERT_EQ(Run("insert into t values(?1, ?2, ?3, ?4)", std::vector(4, Moment(zoned))), 0);
-    EXPECT_EQ(Query("select d, s, z, v from t"),
-              "time 2024-02-29 01:02:03,time 2024-02-29 01:02:03.523,time 2024-02-29 01:02:03.523457 +01:30,"
-              "2024-02-29 01:02:03.523456789 +01:30;");
-    const date::DateTime time{.hour = 12, .minute = 30};
-    for (const char* column : {"v", "d", "s"})
-        EXPECT_EQ(Run("insert into t(" + std::string(column) + ") values(?1)", {Moment(time)}), *column == 'v' ? 0 : 1843) << column;
-    EXPECT_EQ(Query("select v from t where d is null"), "12:30:00;") << "a time alone";
-}
-
 // Transcripts show what else is refused of their table.
 TEST_F(Sqlite, AccountsAreNobodysBusiness) {
     EXPECT_EQ(Answer(connection_->ChangePassword("ann", "secret", "other")), 1017) << "no accounts";
@@ -178,12 +164,6 @@ TEST_F(Sqlite, OnlyWhoOwnsTheFileNeedsNoPassword) {
         return Answer(database_->Connect({"", "", true}, stop_, connection_)) == 1017 ? 0 : 2;
     };
     EXPECT_EQ(geteuid() == 0 ? AsNobody(look) : 0, 0) << "needs another user, as root may become";
-}
-
-TEST_F(Sqlite, ALostTransactionIsToldOnce) {
-    const Status once = engine::sqlite::RolledBack(Error(1653, "full"));
-    EXPECT_EQ(once.Detail(), "full; the transaction was rolled back");
-    EXPECT_EQ(engine::sqlite::RolledBack(once).Detail(), once.Detail());
 }
 
 // Pages that lie in an unwritable file may be of two times once somebody else has a log beside it, or has written it: no

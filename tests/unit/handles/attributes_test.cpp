@@ -205,16 +205,6 @@ TEST_F(AttributesTest, DigitsOfDatetimes) {
 static_assert(sizeof(utext) == 2 && UB4MAXVAL + 1 == UB4MINVAL && SB4MINVAL < SB4MAXVAL && SQLT_AFV == 97);
 static_assert(OCI_TYPECODE_BFLOAT == 100 && OCI_TYPECODE_BDOUBLE == 101 && OCI_FO_REAUTH == 4 && OCI_FO_TXNAL == 8);
 
-TEST_F(AttributesTest, Memory) {
-    const auto heap = [&] { return Attribute<ub4>(env_, OCI_HTYPE_ENV, OCI_ATTR_HEAPALLOC); };
-    const ub4 before = heap();
-    dvoid* handle = nullptr;
-    EXPECT_EQ(OCIHandleAlloc(env_, &handle, OCI_HTYPE_STMT, 10000, nullptr), OCI_SUCCESS);
-    EXPECT_GE(heap(), before + 10000);
-    EXPECT_EQ(OCIHandleFree(handle, OCI_HTYPE_STMT), OCI_SUCCESS);
-    EXPECT_EQ(heap(), before);
-}
-
 TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
     ASSERT_EQ(Describe(describe, "T", OCI_PTYPE_TABLE), 0);

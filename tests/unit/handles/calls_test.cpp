@@ -153,25 +153,4 @@ struct SameMemory {
     }
 };
 
-// What a context was put together from is not what lies there later.
-TEST_F(CallsTest, AHandleWhereAnotherOneWas) {
-    SameMemory memory;
-    OCIEnv* env = nullptr;
-    ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, SameMemory::Allocate, SameMemory::Reallocate, SameMemory::Free, 0, nullptr), 0);
-    dvoid* service = nullptr;
-    ASSERT_EQ(OCIHandleAlloc(env, &service, OCI_HTYPE_SVCCTX, 0, nullptr), 0);
-    constexpr std::array<std::pair<ub4, ub4>, 3> parts{{{OCI_HTYPE_SERVER, OCI_ATTR_SERVER}, {OCI_HTYPE_SESSION, OCI_ATTR_SESSION},
-                                                        {OCI_HTYPE_TRANS, OCI_ATTR_TRANS}}};
-    for (const auto& [type, attribute] : parts) {
-        dvoid *former = nullptr, *next = nullptr;
-        ASSERT_EQ(OCIHandleAlloc(env, &former, type, 0, nullptr), 0);
-        ASSERT_EQ(OCIAttrSet(service, OCI_HTYPE_SVCCTX, former, 0, attribute, err_), 0);
-        EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), former);
-        ASSERT_EQ(OCIHandleFree(former, type) + OCIHandleAlloc(env, &next, type, 0, nullptr), 0);
-        ASSERT_EQ(next, former) << "else this test tests nothing";
-        EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), nullptr) << type;
-    }
-    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
-}
-
 }  // namespace

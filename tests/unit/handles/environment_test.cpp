@@ -1,4 +1,4 @@
-// Texts of error records, and texts put into the application's buffers.
+// Parameters of the library, lists of errors, and texts that end at a zero or their length.
 #include <gtest/gtest.h>
 
 #include <utility>
@@ -47,26 +47,6 @@ TEST(Parameters, SequencesAndSynonyms) {
     Destroy(environment);
 }
 
-// Every number from which another state holds than before it.
-TEST(ErrorTexts, States) {
-    std::string changes, state = "HY000";
-    for (int number = 0; number < 100000; ++number)
-        if (std::exchange(state, SqlState(number)) != state) changes += std::to_string(number) + ' ' + state + ' ';
-    EXPECT_EQ(changes,
-        "0 00000 1 23000 2 HY000 18 61000 22 42000 23 61000 36 HY000 50 61000 69 HY000 100 63000 121 HY000 251 42000 "
-        "252 HY000 370 60000 430 HY000 440 63000 570 HY000 600 60000 900 42000 1000 72000 1001 24000 1004 72000 "
-        "1017 28000 1018 72000 1031 42000 1032 72000 1095 02000 1096 72000 1100 HY000 1400 23000 1401 22001 "
-        "1402 44000 1403 02000 1404 72000 1405 22002 1406 22001 1407 23000 1408 72000 1410 24000 1411 72000 "
-        "1422 21000 1423 72000 1424 22025 1426 22003 1427 21000 1428 72000 1438 22003 1439 72000 1453 25000 "
-        "1454 72000 1455 22003 1456 72000 1457 22003 1458 72000 1476 22012 1477 72000 1479 22024 1481 72000 "
-        "1490 42000 1494 HY000 1700 42000 1800 22008 1900 42000 2091 40000 2093 42000 2100 HY000 2140 42000 "
-        "2290 23000 2300 HY000 2376 61000 2400 HY000 2420 42000 2425 HY000 3106 66000 3136 HY000 4020 61000 "
-        "4040 42000 4060 HY000 4163 22023 4164 HY000 4165 22023 4166 HY000 6430 60000 6450 HY000 6500 65000 "
-        "6511 24000 6512 65000 6600 HY000 8006 24000 8007 HY000 8177 40001 8178 HY000 12100 66000 12600 HY000 "
-        "12899 22001 12900 HY000 ");
-    EXPECT_EQ(SqlState(-1), "HY000");
-}
-
 TEST(ErrorLists, KeepWhatIsAdded) {
     ErrorList list, other;
     list.Add(Error(1));
@@ -89,45 +69,6 @@ TEST(TextIn, EndsAtAZeroOrItsLength) {
     for (const auto& c : cases) {
         Environment* const environment = Environment::Open(c.mode, Environment::SetsOf(c.mode), {}, 0);
         EXPECT_EQ(TextIn(*environment, c.text.data(), c.text.size()).View(), c.read);
-        Destroy(environment);
-    }
-}
-
-TEST(CharacterSets, NoPairIsTornAndWhatIsMalformedIsReplaced) {
-    const std::pair<std::uint16_t, std::string_view> replaced[] = {{31, "a?z"}, {1000, {"a\0\xFD\xFFz\0", 6}}, {2000, {"\0a\xFF\xFD\0z", 6}}};
-    for (const auto& [id, expected] : replaced) {
-        std::string text;
-        EXPECT_FALSE(charset::FromUtf8(*charset::Find(id), "a\xFFz", text)) << id;
-        EXPECT_EQ(text, expected) << id;
-    }
-    const std::size_t whole[] = {0, 0, 2, 2, 2, 2, 6, 6, 8, 8};
-    for (const std::uint16_t id : {1000, 2000}) {
-        std::string text;
-        const CharacterSet& set = *charset::Find(id);
-        EXPECT_TRUE(charset::FromUtf8(set, "\xC3\xA4\xF0\x9F\x98\x80z", text));    // of 2, 4 and 2 bytes
-        for (std::size_t room = 0; room < std::size(whole); ++room) EXPECT_EQ(charset::Whole(set, text, room), whole[room]) << room;
-    }
-}
-
-// Nothing is written behind the room, and what is written is whole characters: so many bytes in 0, 1, ... and the zero.
-TEST(TextToBuffer, CutsBetweenCharacters) {
-    const std::string_view text = "\xC3\xA4\xF0\x9F\x98\x80z";    // 2, 4 and 1 bytes; 1, 2 and 1 units
-    const struct { std::uint32_t mode; std::vector<std::size_t> lengths; } cases[] = {
-        {OCI_DEFAULT, {0, 0, 2, 2, 2, 2, 6, 7}}, {OCI_UTF16, {0, 0, 2, 2, 2, 2, 6, 6, 8}}};
-    for (const auto& [mode, lengths] : cases) {
-        Environment* environment = Environment::Open(mode, Environment::SetsOf(mode), {}, 0);
-        std::string kept;
-        const std::string_view whole = TextOut(*environment, text, kept);
-        const std::size_t zero = mode == OCI_UTF16 ? 2 : 1;
-        for (std::size_t room = 0; room < lengths.size() + zero; ++room) {
-            std::string expected(32, 'x'), buffer = expected;
-            if (room >= zero) {
-                const std::size_t length = lengths[room - zero];
-                expected.replace(0, length, whole.substr(0, length)).replace(length, zero, zero, '\0');
-            }
-            EXPECT_EQ(TextToBuffer(*environment, text, buffer.data(), room), room == whole.size() + zero) << room;
-            EXPECT_EQ(buffer, expected) << room;
-        }
         Destroy(environment);
     }
 }

@@ -66,48 +66,6 @@ TEST_F(Pools, TheIdleGo) {
     EXPECT_EQ(OpenCount(), 1u) << "that which rested long, though the other has just come";
 }
 
-// What is taken away rolls back; nothing of a former session reaches the next but its statements.
-TEST_F(Pools, WhatASessionLeaves) {
-    ASSERT_EQ(Create(0, 1, 1, kHomogeneous | OCI_SPC_STMTCACHE), 0);
-    OCISvcCtx* svc = nullptr;
-    OCIStmt *stmt = nullptr, *again = nullptr;
-    const auto prepare = [&](OCIStmt** place) {
-        return Answer(OCIStmtPrepare2(svc, place, err_, Text("select n from t"), 15, nullptr, 0, OCI_NTV_SYNTAX, 0));
-    };
-    MUST(Get(&svc, err_), Run(svc, "create table t(n number unique)"), prepare(&stmt));
-    MUST(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), Answer(OCIBreak(svc, err_)), Release(svc));
-
-    MUST(Get(&svc, err_), prepare(&again));
-    EXPECT_EQ(again, stmt) << "the cache stays with the connection";
-    EXPECT_EQ(Answer(OCIStmtExecute(svc, again, err_, 0, 0, nullptr, nullptr, OCI_DEFAULT)), 0) << "1013 is not its";
-    MUST(Run(svc, "insert into t values(2)"), Release(svc));
-    EXPECT_EQ(Answer(OCIStmtFetch(again, err_, 1, OCI_FETCH_NEXT, OCI_DEFAULT)), 3114) << "its session is over";
-
-    ASSERT_EQ(Get(&svc, err_), 0);
-    auto* server = Attribute<OCIServer*>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_SERVER);
-    auto* err = New<OCIError>(OCI_HTYPE_ERROR);
-    AtOnce(2, [&](int index) {    // a break reaches the connection that came from the pool
-        if (index == 0) {
-            EXPECT_EQ(Run(svc, "insert into t with recursive r(n) as (select 1 union all select n + 1 from r where"
-                               " n < 20000000) select count(*) from r"), 1013);
-            return;
-        }
-        for (ub1 busy = 0; busy == 0; std::this_thread::yield())
-            EXPECT_EQ(OCIAttrGet(server, OCI_HTYPE_SERVER, &busy, nullptr, OCI_ATTR_SERVER_BUSY, err), OCI_SUCCESS);
-        EXPECT_EQ(OCIBreak(svc, err), OCI_SUCCESS);
-    });
-    EXPECT_EQ(Run(svc, "insert into t values(2)"), 1) << "the release has committed";
-    MUST(Run(svc, "insert into t values(3)"), Destroy(OCI_SPD_FORCE));
-    EXPECT_EQ(Run(svc, "insert into t values(4)"), 1012);
-    EXPECT_EQ(Release(svc), 1012);
-    EXPECT_EQ(Release(svc), OCI_INVALID_HANDLE) << "the context has gone all the same";
-    MUST(Create(1, 1, 1), Get(&svc, err_));
-    EXPECT_EQ(Attribute<ub4>(svc, OCI_HTYPE_SVCCTX, OCI_ATTR_STMTCACHESIZE), 20u) << "of the handle, that was told before";
-    EXPECT_EQ(Run(svc, "insert into t values(3)"), 0) << "force has rolled back";
-    ASSERT_EQ(prepare(&stmt), 0);    // kept to the environment's end
-    ASSERT_EQ(Answer(OCIStmtRelease(stmt, err_, nullptr, 0, OCI_DEFAULT)), 0);
-}
-
 // A newcomer stands behind who waits, though a session has just come back; a pool that grows has room for who waits.
 TEST_F(Pools, WhoWaitsComesFirst) {
     MUST(Create(1, 1, 1), Set<ub1>(OCI_ATTR_SPOOL_GETMODE, OCI_SPOOL_ATTRVAL_TIMEDWAIT));

@@ -44,7 +44,6 @@ protected:
         EXPECT_EQ(Answer(OCILobGetLength(svc, err, of, &length)), 0);
         return length;
     }
-    std::string Stored() { return One("select c from l"); }
 
     OCILobLocator* lob = nullptr;
     OCILobLocator* other = nullptr;
@@ -153,49 +152,6 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     };
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 4, OCI_FIRST_PIECE, this, leaves, 0, 0)), 3114);
     ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
-}
-
-// A locator that was not fetched to be written shows what was there, or nothing any more.
-TEST_F(Lobs, ValuesThatAreTrimmedAreOthers) {
-    if (OnServer()) return;    // which keeps what was there
-    for (const ub4 length : {11u, 10u, 0u}) {
-        Fetch(other, "select c from l");
-        Fetch(lob);
-        MUST(Answer(OCILobTrim(svc, err, lob, length)));
-        EXPECT_EQ(Read(other), length == 11 ? "11:h\xC3\xA4llo world" : "!22924") << length;
-        EXPECT_EQ(LengthOf(lob), length);
-        MustRun("rollback");
-    }
-}
-
-// An open query shows the value as it was; what waits to become one goes with the savepoint it came after.
-TEST_F(Lobs, WhatGrowsIsNewToOthersAndGoesBackWithItsSavepoint) {
-    MustRun("insert into l select 2, c, b from l", "insert into l select 3, c, b from l where k = 1", "commit", "savepoint s");
-    Fetch(lob, "select c from l where k = 3 for update");
-    char text[40] = "";
-    MUST(Query("select c || '.' from l", {Text(text)}), Write(lob, 12, " and more"));
-    OCIStmt* const query = std::exchange(stmt, New<OCIStmt>(OCI_HTYPE_STMT));
-    MustRun("update l set b = x'04' where k = 1");
-    EXPECT_EQ(One("select c from l where k = 3"), "h\xC3\xA4llo world and more");
-    OCIStmt* const change = std::exchange(stmt, query);
-    MUST(StatementTest::Fetch(), StatementTest::Fetch());
-    EXPECT_STREQ(text, "h\xC3\xA4llo world.");
-    stmt = change;
-    MUST(Write(lob, 21, " and more"), Run("rollback to s"), Run("commit"));
-    EXPECT_EQ(One("select c from l where k = 3"), "h\xC3\xA4llo world");
-}
-
-// What one locator knows of the places of characters is nothing once another has written.
-TEST_F(Lobs, TwoLocatorsOfOneValue) {
-    Fetch(lob);
-    Fetch(other);
-    EXPECT_EQ(Write(lob, 1, "x"), 0);
-    EXPECT_EQ(Read(other, 2, 4) + std::to_string(LengthOf(other)), "2:lo11");
-    EXPECT_EQ(Write(lob, 1, "\xC3\xB6"), 0);
-    EXPECT_EQ(Read(other, 2, 7) + std::to_string(LengthOf(other)), "2:wo11");
-    EXPECT_EQ(Answer(OCILobTrim(svc, err, lob, 5)), 0);
-    EXPECT_EQ(Read(other, 9, 4) + std::to_string(LengthOf(other)), "2:lo5");
-    EXPECT_EQ(Stored(), "\xC3\xB6\xC3\xA4llo");
 }
 
 // Places that the calls want and scripts always give; amounts of the wider calls, in bytes and characters.

@@ -57,20 +57,6 @@ TEST_F(NullArguments, OfNumbers) {
              {".hn..nn", Nulls(OCINumberToText, err_, &one, Text("9.9"), 3, nullptr, 0, &size_, text_)}});
 }
 
-TEST_F(NullArguments, OfDates) {
-    OCIDate day;
-    sb4 days = 0;
-    EXPECT_EQ(OCIDateSysDate(err_, &day), OCI_SUCCESS);
-    Compare({{".hnn", Nulls(OCIDateAddDays, err_, &day, 1, &day)}, {".hnn", Nulls(OCIDateAddMonths, err_, &day, 1, &day)},
-             {".hnn", Nulls(OCIDateAssign, err_, &day, &day)}, {".hnn", Nulls(OCIDateLastDay, err_, &day, &day)},
-             {".hnn", Nulls(OCIDateCheck, err_, &day, &flags_)},
-             {".hnnn", Nulls(OCIDateCompare, err_, &day, &day, &order_)},
-             {".hnnn", Nulls(OCIDateDaysBetween, err_, &day, &day, &days)}, {".hn", Nulls(OCIDateSysDate, err_, &day)},
-             {".hnnn", Nulls(OCIDateNextDay, err_, &day, Text("SUN"), 3, &day)},
-             {".hn..n", Nulls(OCIDateFromText, err_, Text("01-JAN-24"), 9, nullptr, 0, nullptr, 0, &day)},
-             {".hn..nn", Nulls(OCIDateToText, err_, &day, nullptr, 0, nullptr, 0, &size_, text_)}});
-}
-
 TEST_F(NullArguments, OfDatetimes) {
     auto* at = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);
     auto* to = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIMESTAMP_TZ);

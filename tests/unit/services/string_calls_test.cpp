@@ -1,24 +1,9 @@
-// The calls on strings and raws.
+// The calls on strings, with what is none.
 #include "support/call_fixture.h"
 
 namespace {
 
 using StringCalls = CallFixture;
-
-TEST_F(StringCalls, StaysWhereItIsAndEndsInZeros) {
-    OCIString* string = nullptr;
-    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("a long text"), 11, &string), OCI_SUCCESS);
-    OCIString* const first = string;
-    ASSERT_EQ(OCIStringAssignText(env_, err_, Text("bye"), 3, &string), OCI_SUCCESS);
-    EXPECT_EQ(string, first) << "assigned in place";
-    const auto contents = [&] { return std::string_view(reinterpret_cast<char*>(OCIStringPtr(env_, string)), 5); };
-    EXPECT_EQ(contents(), std::string_view("bye\0\0", 5));
-    ASSERT_EQ(OCIStringResize(env_, err_, 3, &string), OCI_SUCCESS);
-    EXPECT_EQ(contents(), std::string_view("bye\0\0", 5));
-    ASSERT_EQ(OCIStringResize(env_, err_, 0, &string), OCI_SUCCESS);
-    EXPECT_EQ(string, nullptr);
-    EXPECT_EQ(OCIStringPtr(env_, first), nullptr);
-}
 
 // Nor is a text read whose length cannot be meant.
 TEST_F(StringCalls, RefuseWhatIsNoString) {

@@ -1,4 +1,4 @@
-// SQL text, rewritten into an engine's spellings: its offsets, and the time that hostile texts take.
+// SQL text, rewritten into an engine's spellings: the time that hostile texts take.
 #include <gtest/gtest.h>
 
 #include <chrono>
@@ -24,15 +24,6 @@ engine::Dialect TestDialect() {
     dialect.decode = &kDecode;
     dialect.subquery_alias = " as q";
     return dialect;
-}
-
-TEST(SqlText, EngineOffsetsPointIntoTheApplicationsText) {
-    const std::string_view text = "begin open :c for select :abc, sysdate, wrong from dual; end;";
-    const sql::StatementText statement = sql::Scan(text);
-    const sql::EngineText engine = sql::Rewrite(text, statement, statement.steps[0], TestDialect());
-    EXPECT_EQ(engine.SourceOffset(engine.sql.find("wrong")), text.find("wrong"));
-    EXPECT_EQ(engine.SourceOffset(engine.sql.find("now")), text.find("sysdate"));
-    EXPECT_EQ(engine.SourceOffset(0), text.find("select"));
 }
 
 // Deep nesting, quotes that never close, comments within comments, placeholders without end: all linear.

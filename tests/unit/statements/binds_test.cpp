@@ -1,77 +1,9 @@
-// Binds by name and position, what GetBindInfo tells of them, the statement cache, and calls with pointers and numbers
-// that no application should pass.
+// Binds: calls with pointers and numbers that no application should pass, and their wide forms.
 #include "support/statement_fixture.h"
 
 namespace {
 
 class Binds : public StatementTest {};
-
-TEST_F(Binds, ManyBindsAndDefinesLeaveNothingBehind) {
-    sb4 value = 5;
-    const auto blocks = [&] {
-        for (int round = 0; round < 3; ++round) {
-            EXPECT_EQ(Prepare("select :a, :b from dual"), 0);
-            for (int again = 0; again < 3; ++again) EXPECT_EQ(Bind(1, Int(value)) + BindName("b", Int(value)), 0);
-            SHOULD(Define(1, Int(value)), Execute(1));
-        }
-        return OCI_memGetMemCount();
-    };
-    const sb4 held = blocks();
-    EXPECT_EQ(blocks(), held);
-}
-
-// Of each placeholder the handle that binds it, which scripts do not show.
-TEST_F(Binds, WhatIsBound) {
-    ASSERT_EQ(Prepare("insert into t values(:first, :second:ind, :FIRST)"), 0);
-    sb4 value = 1, found = 0;
-    OCIBind* bind = nullptr;
-    ASSERT_EQ(Bind(&bind, 2, Int(value)), 0);
-    std::array<OraText*, 3> names{}, indicators{};
-    std::array<ub1, 3> lengths{}, repeated{};
-    std::array<OCIBind*, 3> binds{};
-    ASSERT_EQ(Answer(OCIStmtGetBindInfo(stmt, err, 3, 1, &found, names.data(), lengths.data(), indicators.data(),
-                                        lengths.data(), repeated.data(), binds.data())), 0);
-    EXPECT_EQ(found, 3);
-    EXPECT_EQ(binds, (std::array<OCIBind*, 3>{nullptr, bind, nullptr}));
-    EXPECT_EQ(std::string_view(reinterpret_cast<char*>(indicators[1]), 3), "IND");
-}
-
-// ---- The statement cache
-
-class Cache : public StatementTest {
-protected:
-    void Prepare2(std::string_view text) {
-        MUST(OCIStmtPrepare2(svc, &stmt, err, Bytes(text), Size(text), nullptr, 0, OCI_NTV_SYNTAX, OCI_DEFAULT));
-    }
-    void Keep(ub4 size) { MUST(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, &size, 0, OCI_ATTR_STMTCACHESIZE, err)); }
-    void Release() { ASSERT_EQ(OCIStmtRelease(stmt, err, nullptr, 0, OCI_DEFAULT), OCI_SUCCESS); }
-};
-
-// What a statement has bound is there as long as the cache keeps it, and goes with it.
-TEST_F(Cache, KeepsBinds) {
-    Keep(2);
-    sb4 in = 7, out = 0;
-    ub2 set = 0;
-    OCIBind* bind = nullptr;
-    Prepare2("select :a from dual");
-    MUST(Bind(&bind, 1, Int(in)), Define(1, Int(out)), Execute(1));
-    Release();
-    in = 8;
-    Prepare2("select :a from dual");
-    EXPECT_EQ(Fetch(), 24338) << "not executed yet";
-    ASSERT_EQ(Execute(1), 0);
-    EXPECT_EQ(out, 8);
-    Release();
-    Prepare2("select 3 from dual");
-    Release();
-    EXPECT_EQ(OCIAttrGet(bind, OCI_HTYPE_BIND, &set, nullptr, OCI_ATTR_CHARSET_ID, err), OCI_SUCCESS);
-    Keep(1);
-    Prepare2("select :a from dual");    // the older one went
-    EXPECT_EQ(OCIAttrGet(bind, OCI_HTYPE_BIND, &set, nullptr, OCI_ATTR_CHARSET_ID, err), OCI_INVALID_HANDLE);
-    Release();    // the logoff that follows finds it kept
-}
-
-// ---- Calls as no application should make them
 
 // Null, foreign, freed and unsuitable pointers in each place; numbers at their ends. Each call comes back with a code,
 // an error for all but the few that are right by chance.

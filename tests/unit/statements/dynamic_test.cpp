@@ -109,34 +109,6 @@ protected:
     OCIDefine* defines_[4] = {};
 };
 
-// One ask for each piece: of the same iteration until the value ends. A callback that goes by the iteration alone gives
-// its piece again, or begins with a piece that is none to begin with: that is the whole value.
-TEST_F(Dynamic, ValuesGoInByIteration) {
-    const struct { ub4 rows; std::vector<string> given; const char *asked, *stored; sb4 answer; } cases[] = {
-        {3, {"=one", "0", "=three"}, "0.0.0 1.0.0 2.0.0 ", "one,-,three", 0},
-        {2, {"<a", "+bc", "+", ">d", "=e"}, "0.0.0 0.0.2 0.0.2 0.0.2 1.0.0 ", "abcd,e", 0},
-        {1, {"<a", "+a", "+a", ">"}, "0.0.0 0.0.2 0.0.2 0.0.2 ", "aaa", 0},
-        {3, {"+one", "+one", "<two", "<two", ">three"}, "0.0.0 0.0.2 1.0.0 1.0.2 2.0.0 ", "one,two,three", 0},
-        {2, {"+a", "+b", ">c", "="}, "0.0.0 0.0.2 0.0.2 1.0.0 ", "abc,-", 0},
-        {2, {"=a", "<b", "<c"}, "0.0.0 1.0.0 1.0.2 ", "a", 24370},
-        {2, {"=a", "<b", "=b"}, "0.0.0 1.0.0 1.0.2 ", "a", 24370},
-        {1, {"<b", "+c", "+c", "<c"}, "0.0.0 0.0.2 0.0.2 0.0.2 ", "-", 24370}};
-    for (const auto& c : cases) {
-        MustRun("create table t(id number, a varchar2(40))");
-        std::vector<sb4> ids(c.rows, 1);
-        Giver giver(c.given);
-        MUST(Prepare("insert into t values(:1, :2)"), Bind(1, {ids.data(), 4, SQLT_INT}));
-        ASSERT_EQ(BindTo(2, &giver, nullptr), 0);
-        EXPECT_EQ(Execute(c.rows), c.answer) << c.asked;
-        EXPECT_EQ(giver.asked, c.asked);
-        EXPECT_EQ(One("select group_concat(nvl(a, '-'), ',') from t"), c.stored);
-        giver.next = 0, giver.asked.clear();
-        EXPECT_EQ(Execute(c.rows), c.answer) << "anew, from the first iteration";
-        EXPECT_EQ(giver.asked, c.asked);
-        MustRun("drop table t");
-    }
-}
-
 // Variables of a block: what goes in is read, what was assigned comes out; elements of tables each in their turn.
 TEST_F(Dynamic, BlocksAndTables) {
     MustRun("create table t(a varchar2(40))");
@@ -160,44 +132,6 @@ TEST_F(Dynamic, BlocksAndTables) {
     EXPECT_EQ(selected.Flush(), "p|q|r|s|");
     ASSERT_EQ(Bind(&binds_[1], 1, InPieces(SQLT_CHR), OCI_DEFAULT, 4, &count), 0);
     EXPECT_EQ(ExecuteCode(), OCI_NEED_DATA) << "bound anew it has no callbacks";
-}
-
-// What a callback must not answer, in either direction; a place is not looked at where the value is null.
-TEST_F(Dynamic, AnswersThatAreRefused) {
-    MustRun("create table t(a varchar2(40))");
-    char room[4] = "xyz";
-    sb2 null = -1;
-    const struct { sb4 code; dvoid* buffer; ub4 length; ub1 piece; dvoid* indicator; sb4 in, out; } cases[] = {
-        {OCI_CONTINUE, room, 3, OCI_ONE_PIECE, nullptr, 0, 0}, {OCI_SUCCESS, room, 3, OCI_ONE_PIECE, nullptr, 24343, 24343},
-        {OCI_ERROR, room, 3, OCI_ONE_PIECE, nullptr, 24343, 24343}, {OCI_CONTINUE, nullptr, 3, OCI_ONE_PIECE, nullptr, 24306, 24306},
-        {OCI_CONTINUE, nullptr, 0, OCI_ONE_PIECE, nullptr, 0, 24306}, {OCI_CONTINUE, room, 0, OCI_ONE_PIECE, nullptr, 0, 24307},
-        {OCI_CONTINUE, nullptr, 9, OCI_ONE_PIECE, &null, 0, 24306}, {OCI_CONTINUE, room, 3, 4, nullptr, 24370, 0}};
-    for (const auto& c : cases) {
-        Callback callback;
-        callback.act = [&](Callback::Place& out) {
-            out = {c.buffer, c.length, c.piece, c.indicator};
-            return c.code;
-        };
-        MUST(Prepare("insert into t values(:1)"), BindTo(1, &callback, nullptr));
-        EXPECT_EQ(Execute(2), c.in);
-        EXPECT_EQ(RowCount(), c.in == 0 ? 2u : 0u);
-        MUST(Prepare("select 'abc' from dual union all select 'def' from dual"), DefineTo(1, callback));
-        ASSERT_EQ(Execute(0), 0);
-        EXPECT_EQ(Fetch(), c.out);
-        EXPECT_EQ(RowsFetched(), c.out == 0 ? 1u : 0u);
-        EXPECT_EQ(Fetch(), c.out) << "the next row";
-        EXPECT_EQ(Fetch(), 1403);
-        MUST(Prepare("insert into t values('abc') returning a into :1"), BindTo(1, nullptr, &callback));
-        EXPECT_EQ(Execute(), c.out);
-    }
-    const auto no_length = [](dvoid* context, OCIDefine*, ub4, dvoid** buffer, ub4** length, ub1*, dvoid**, ub2**) -> sb4 {
-        *buffer = context, *length = nullptr;
-        return OCI_CONTINUE;
-    };
-    OCIDefine* define = nullptr;
-    ASSERT_EQ(Query("select 'abc' from dual", {}, 0) + Define(&define, 1, InPieces(SQLT_CHR)), 0);
-    ASSERT_EQ(Answer(OCIDefineDynamic(define, err, room, no_length)), 0);
-    EXPECT_EQ(Fetch(), 24307);
 }
 
 // What callbacks do to what calls them. The statement itself is closed; the rest of the session is not.

@@ -23,44 +23,6 @@ TEST_F(Executing, RowsThatFail) {
     EXPECT_EQ((StatementCalls{env, other}.Answer(OCIParamGet(err, OCI_HTYPE_ERROR, other, nullptr, 0))), 21560);
 }
 
-// Rows are told of the last execution that succeeds, whatever fails behind it.
-TEST_F(Executing, RowsReturnedByTheLastExecution) {
-    const struct { std::array<sb4, 3> in; ub4 mode; sb4 answer; ub4 returned; } cases[] = {
-        {{7, 8, 7}, OCI_BATCH_ERRORS, 24381, 1}, {{7, 7, 7}, OCI_BATCH_ERRORS, 24381, 1},
-        {{3, 3, 3}, OCI_BATCH_ERRORS, 24381, 0}, {{7, 7, 8}, OCI_DEFAULT, 1, 1}};
-    MustRun("create table t(a number primary key)", "insert into t values(3)");
-    for (const auto& c : cases) {
-        MustRun("delete from t where a > 3");
-        std::array<sb4, 3> in = c.in, back = {};
-        OCIBind* bind = nullptr;
-        MUST(Prepare("insert into t values(:a) returning a into :b"));
-        MUST(BindName("a", Int(in)), BindName(&bind, "b", Int(back)));
-        for (const bool again : {false, true}) {    // when all of them are there
-            EXPECT_EQ(Execute(3, c.mode), again && c.mode == OCI_DEFAULT ? 1 : c.answer);
-            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_ROWS_RETURNED, bind, OCI_HTYPE_BIND), again ? 0 : c.returned) << in[1];
-        }
-    }
-}
-
-TEST_F(Executing, BlocksWhoseCommitFails) {
-    MustRun("create table t(a number primary key)");
-    MustRun("create table c(id integer references t deferrable initially deferred)", "commit");
-    EXPECT_EQ(Run("begin insert into c values(77); commit; insert into c values(88); end;"), 2091);
-    EXPECT_EQ(One("select count(*) from c"), "0");
-}
-
-// A value that does not fit its place undoes the row that gave it.
-TEST_F(Executing, ReturningWhatDoesNotFit) {
-    MustRun("create table t(a number)");
-    sb4 in[3] = {1, 1000, 3};
-    sb1 out[3] = {};
-    ASSERT_EQ(Ready("insert into t values(:a) returning a into :b", {Int(in), Int(out)}), 0);
-    EXPECT_EQ(Execute(3), 1455);
-    EXPECT_EQ(Execute(3, OCI_BATCH_ERRORS), 24381);
-    EXPECT_EQ(One("select group_concat(a) from t"), "1,1,3");
-    EXPECT_EQ(out[2], 3);
-}
-
 // Counts of elements around the room there is, in and out.
 TEST_F(Executing, TablesAtTheirLimits) {
     MustRun("create table t(a number primary key)");
@@ -98,64 +60,6 @@ TEST_F(Executing, TablesAtTheirLimits) {
         MUST(Bind(1, Int(got), OCI_DEFAULT, c.most, &(current = 0)));
         EXPECT_EQ(Execute(), 1414) << "beside a plain bind a table takes one row";
     }
-}
-
-// Of several columns, an error in one tells more than a truncation in another, whichever comes first.
-TEST_F(Executing, TheGravestOfARow) {
-    for (const bool cut_first : {true, false}) {
-        char text[3] = "";
-        ub2 code = 0;
-        sb1 small = 0;
-        ASSERT_EQ(Prepare(cut_first ? "select 'abcdef', 1000 from dual" : "select 1000, 'abcdef' from dual"), 0);
-        ASSERT_EQ(Define(cut_first ? 1 : 2, Text(text, nullptr, nullptr, &code)), 0);
-        ASSERT_EQ(Define(cut_first ? 2 : 1, Int(small)), 0);
-        EXPECT_EQ(Execute(1), 1455) << cut_first;
-        EXPECT_EQ(code, 1406) << "the other column is stored all the same";
-    }
-}
-
-// What was compiled and opened on one session is left behind when the statement is executed on another.
-TEST_F(Executing, ThroughAnotherSession) {
-    OCISvcCtx* services[2] = {svc, nullptr};
-    ASSERT_EQ(Logon(&services[1]), OCI_SUCCESS);
-    for (const sb4 number : {1, 2}) {
-        svc = services[number - 1];
-        MustRun("create temporary table t(a number)", "insert into t values(" + std::to_string(number) + ")");
-    }
-    sb4 value = 0;
-    ASSERT_EQ(Query("select a from t", {Int(value)}, 0), 0);
-    for (const sb4 number : {2, 1, 2}) {
-        svc = services[number - 1];
-        MUST(Execute(0), Fetch());
-        EXPECT_EQ(value, number);
-        for (OCISvcCtx* service : services) {
-            const auto* session = Attribute<OCISession*>(OCI_ATTR_SESSION, service, OCI_HTYPE_SVCCTX);
-            EXPECT_EQ(Attribute<ub4>(OCI_ATTR_NUM_OPEN_STMTS, session, OCI_HTYPE_SESSION), service == svc ? 1u : 0u);
-        }
-    }
-    EXPECT_EQ(OCILogoff(services[0], err), OCI_SUCCESS);
-}
-
-TEST_F(Executing, LogoffEndsWhatIsOpen) {
-    sb4 value = 0;
-    MUST(Query("select 1 from dual", {Int(value)}, 0), OCILogoff(svc, err));
-    EXPECT_EQ(Fetch(), 3114);
-    EXPECT_EQ(Execute(0), 3114);
-    ASSERT_EQ(Prepare("select 2 from dual"), 0);
-    EXPECT_EQ(Fetch(), 24338) << "a new text was never executed";
-}
-
-// Between fetches a column may be defined anew, as another type, and its define be freed: the other stays defined.
-TEST_F(Executing, DefinesMayBeMadeAnewAndFreed) {
-    sb4 id = 0, name = 0;
-    sb8 wide = 0;
-    OCIDefine* define = nullptr;
-    const char* const rows = "select 1, 10 from dual union all select 2, 20 from dual union all select 3, 30 from dual";
-    MUST(Query(rows, {Int(id), Int(name)}));
-    MUST(Define(&define, 1, Int(wide)), Fetch());
-    EXPECT_EQ(wide, 2);
-    MUST(OCIHandleFree(define, OCI_HTYPE_DEFINE), Fetch());
-    EXPECT_EQ(wide + id + name, 2 + 1 + 30);
 }
 
 // What the server says besides comes with a success, in its order; behind a truncation, which is told first.

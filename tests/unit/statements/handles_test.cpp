@@ -79,20 +79,6 @@ TEST_F(Handles, ValuesOfNoSize) {
         EXPECT_EQ(Bind(1, {area, 0, type}), 1483) << type;
 }
 
-// A name stays readable while the statement lives: when its parameter is freed or shows another column, too.
-TEST_F(Handles, ColumnNamesStay) {
-    ASSERT_EQ(Query("select 1 as a_name_longer_than_a_short_one from dual", {}, 0), 0);
-    const std::string_view first = ColumnName(Column(1));
-    EXPECT_EQ(ColumnName(Column(1)).data(), first.data()) << "asking again keeps nothing more";
-    EXPECT_EQ(Column(1), Column(1));
-    ASSERT_EQ(Query("select 1 as another_name_that_is_long_too from dual", {}, 0), 0);
-    dvoid* const parameter = Column(1);
-    const std::string_view second = ColumnName(parameter);
-    ASSERT_EQ(OCIDescriptorFree(parameter, OCI_DTYPE_PARAM), OCI_SUCCESS);
-    EXPECT_EQ(first, "A_NAME_LONGER_THAN_A_SHORT_ONE");
-    EXPECT_EQ(second, "ANOTHER_NAME_THAT_IS_LONG_TOO");
-}
-
 // A memory function frees the define, or the whole statement, in the middle of the fetch that needs memory for it.
 struct Saboteur {
     dvoid* victim = nullptr;

@@ -1,7 +1,4 @@
 // The XA switch: arguments, threads of control, time, servers that lose a branch; what transcripts cannot show.
-#include <sys/wait.h>
-#include <unistd.h>
-
 #include <future>
 #include <thread>
 
@@ -42,10 +39,6 @@ protected:
         return Answer(OCIStmtExecute(xaoSvcCtx(name ? Text(name) : nullptr), stmt_, err_, 1, 0, nullptr, nullptr, OCI_DEFAULT));
     }
     sb4 Change() { return Run("one", "insert into t values(1)"); }
-    static int Recovered(int rmid = 1) {
-        XID found[4];
-        return rmXaSwitch.xa_recover_entry(found, 4, rmid, TMSTARTRSCAN | TMENDRSCAN);
-    }
     static sb4 Code(int rmid = 1) {
         SQLCA diagnostics{};
         EXPECT_EQ(XaGetInfo(rmid, &diagnostics), XA_OK);
@@ -203,44 +196,6 @@ TEST_F(XaCalls, ABranchThatTheServerHasLost) {
         EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), lost ? XAER_RMFAIL : XA_OK);
         EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), XAER_NOTA);
     }
-}
-
-class XaOfProcesses : public XaCalls {
-protected:
-    void SetUp() override {
-        Folder();
-        MakeDatabase();
-        CallFixture::SetUp();
-        stmt_ = New<OCIStmt>(OCI_HTYPE_STMT);
-    }
-};
-
-// What another process has prepared: a server keeps it, and its name is taken; a file has rolled it back.
-TEST_F(XaOfProcesses, NamesThatAreTaken) {
-    XID xid = Named("g", "b");
-    const pid_t child = fork();
-    if (child == 0) {
-        const bool done = Open(1, "DB=work") == XA_OK && Run("work", "create table t(n number)") == 0 &&
-                          Call(kStart, xid, TMNOFLAGS) == XA_OK && Run("work", "insert into t values(1)") == 0 &&
-                          Call(kEnd, xid, TMSUCCESS) == XA_OK && Call(kPrepare, xid, TMNOFLAGS) == XA_OK;
-        _exit(done ? 0 : 1);
-    }
-    int status = 1;
-    waitpid(child, &status, 0);
-    ASSERT_EQ(status, 0);
-    ASSERT_EQ(Open(1, "DB=work"), XA_OK);
-    EXPECT_EQ(Recovered(), OnServer());
-    EXPECT_EQ(Call(kStart, xid, TMNOFLAGS), OnServer() ? XAER_DUPID : XA_OK);
-    if (!OnServer()) { EXPECT_EQ(Call(kEnd, xid, TMSUCCESS), XA_OK); }
-    OCISvcCtx* svc = nullptr;
-    ASSERT_EQ(LogOn(&svc, "work"), 0);
-    auto* const trans = New<OCITrans>(OCI_HTYPE_TRANS);
-    ASSERT_EQ(Answer(OCIAttrSet(trans, OCI_HTYPE_TRANS, &xid, sizeof xid, OCI_ATTR_XID, err_)), 0);
-    ASSERT_EQ(Answer(OCIAttrSet(svc, OCI_HTYPE_SVCCTX, trans, 0, OCI_ATTR_TRANS, err_)), 0);
-    EXPECT_EQ(Answer(OCITransStart(svc, err_, 0, OCI_TRANS_NEW)), 24757);
-    EXPECT_EQ(Call(kRollback, xid, TMNOFLAGS), XA_OK);
-    EXPECT_EQ(Answer(OCITransStart(svc, err_, 0, OCI_TRANS_NEW)), 0) << "the name is free";
-    SHOULD(Answer(OCITransRollback(svc, err_, OCI_DEFAULT)), Answer(OCILogoff(svc, err_)));
 }
 
 }  // namespace
