@@ -54,12 +54,10 @@ sword Test(OCIError* err, const OCINumber* value, sword* result, number::Tested 
     return Run(err, {value}, result, [&] { return function(*value, result); });
 }
 
-bool IsIntegerLength(uword length) { return length == 1 || length == 2 || length == 4 || length == 8; }
-
 // An unusual length comes with a null pointer from callers that have no integer of that width: the length is told
 // first.
 Errno CheckInteger(uword length, uword sign, const void* integer, const OCINumber* value) {
-    if (!IsIntegerLength(length)) return errors::kBadIntegerLength;
+    if (!number::IsIntegerLength(length)) return errors::kBadIntegerLength;
     if (sign != OCI_NUMBER_UNSIGNED && sign != OCI_NUMBER_SIGNED) return errors::kBadSignFlag;
     return integer && value ? 0 : errors::kNullArgument;
 }
@@ -306,8 +304,8 @@ void OCINumberSetPi(OCIError*, OCINumber* result) {
 sword OCINumberFromInt(OCIError* err, const dvoid* value, uword length, uword sign, OCINumber* out) {
     return EnterError(err, [&](ErrorHandle&) -> Status {
         if (const Errno error = CheckInteger(length, sign, value, out)) return Error(error);
-        const Errno error = number::FromInteger(value, length, sign == OCI_NUMBER_SIGNED, out);
-        return error ? Error(error) : Status();
+        number::FromInteger(value, length, sign == OCI_NUMBER_SIGNED, out);
+        return {};
     });
 }
 

@@ -137,7 +137,7 @@ BigReal& BigReal::operator=(const BigReal& other) {
     zero_ = other.zero_;
     negative_ = other.negative_;
     exponent_ = other.exponent_;
-    if (!zero_ && this != &other) mpn_copyi(limbs_, other.limbs_, count_);
+    if (!zero_) mpn_copyi(limbs_, other.limbs_, count_);
     return *this;
 }
 
@@ -145,10 +145,7 @@ BigReal& BigReal::operator=(const BigReal& other) {
 void BigReal::Take(const mp_limb_t* limbs, mp_size_t size) {
     for (; size > 0 && limbs[size - 1] == 0; --size) exponent_ -= kLimbBits;
     zero_ = size == 0;
-    if (zero_) {
-        negative_ = false;
-        return;
-    }
+    if (zero_) return;
     const int shift = std::countl_zero(limbs[size - 1]);
     exponent_ -= shift;
     const mp_size_t kept = std::min<mp_size_t>(size, count_), low = count_ - kept;
@@ -258,7 +255,7 @@ BigReal BigReal::Nearest(unsigned* quarter) const {
     mpn_zero(limbs, units);
     limbs[units] = limbs[units] >> bit << bit;
     mp_limb_t low = limbs[units] >> bit;
-    if (bit == kLimbBits - 1) low |= (units + 1 <= count_ ? limbs[units + 1] : 0) << 1;
+    if (bit == kLimbBits - 1) low |= limbs[units + 1] << 1;
     *quarter = static_cast<unsigned>(low & 3);
     if (negative_) *quarter = (4 - *quarter) & 3;
     return FromWhole(count_, limbs, count_ + 1, exponent_ - kLimbBits * count_).WithSign(negative_);

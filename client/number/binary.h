@@ -11,8 +11,6 @@ namespace number {
 // Limbs of one attempt after the other. A value that the last one finds in the middle between two numbers is there: no
 // function of numbers of 40 digits comes so near otherwise.
 constexpr int kAttempts[] = {4, 8, 18};
-// By how many limbs an argument may be longer than the result.
-constexpr int kMostExtraLimbs = BigReal::kMaxLimbs - 18;
 
 // Of what is within its limits, the exponent of a function's argument or result in bits.
 constexpr long kBeyondNumbers = 450;  // 2^420 is 1E126

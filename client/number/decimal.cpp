@@ -48,7 +48,7 @@ Decimal ToDecimal(const Digits& digits) noexcept {
 Errno FromDecimal(std::string_view digits, int point, bool negative, OCINumber* result) noexcept {
     const std::size_t zeros = std::min(digits.find_first_not_of('0'), digits.size());
     digits.remove_prefix(zeros);
-    point = std::clamp(point, -100'000, 100'000) - static_cast<int>(std::min<std::size_t>(zeros, 200'000));
+    point = std::clamp(point, -100'000, 100'000) - static_cast<int>(zeros);
     if (digits.empty()) {
         SetZero(result);
         return 0;

@@ -23,8 +23,8 @@ public:
             SetZero(result);
             return 0;
         }
-        if (!SignBefore() || !Whole() || !Fraction()) return errors::kBadNumberText;
-        if (!digits_.Any()) return errors::kBadNumberText;
+        SignBefore();
+        if (!Whole() || !Fraction() || !digits_.Any()) return errors::kBadNumberText;
         int exponent = 0;
         if (model_.scientific) at_ = static_cast<std::size_t>(ReadExponent(Here(), End(), &exponent) - text_.data());
         if (model_.currency == FormatModel::Currency::trailing) TakeMoney();
@@ -62,12 +62,11 @@ private:
     }
 
     // A sign in front, before or behind the currency.
-    bool SignBefore() {
+    void SignBefore() {
         const bool plain = model_.sign == FormatModel::Sign::before || model_.sign == FormatModel::Sign::leading_s;
         bool found = plain && TakeSign();
         if (model_.sign == FormatModel::Sign::brackets) negative_ = Take('<');
         if (model_.currency == FormatModel::Currency::leading && TakeMoney() && plain && !found) TakeSign();
-        return true;
     }
     bool TakeSign() {
         negative_ = Take('-');
@@ -179,7 +178,6 @@ Errno ReadWithoutModel(std::string_view text, const Nls& nls, OCINumber* result)
 }  // namespace
 
 Errno FromText(std::string_view text, std::string_view model, const Nls& nls, OCINumber* result) noexcept {
-    if (text.empty()) return errors::kBadNumberText;
     const bool nines = model.size() == text.size() && model.find_first_not_of('9') == std::string_view::npos;
     if (nines || model.empty()) return ReadWithoutModel(text, nls, result);
     FormatModel parsed;

@@ -60,13 +60,12 @@ Angle TurnBack(const Digits& argument, int limbs, long* lost_bits) {
         const Angle angle = SineAndCosine(BigReal::FromDigits(limbs, argument).Magnitude());
         return {argument.negative ? angle.sine.Negated() : angle.sine, angle.cosine};
     }
-    const int extra = 1 + static_cast<int>(rough.Exponent() / BigReal::kLimbBits);
-    const int precision = limbs + std::min(extra + 1, kMostExtraLimbs);
+    const int precision = limbs + 2 + static_cast<int>(rough.Exponent() / BigReal::kLimbBits);
     const BigReal x = BigReal::FromDigits(precision, argument), half_pi = BigReal::HalfPi(precision);
     unsigned quarter = 0;
     const BigReal turns = (x / half_pi).Nearest(&quarter);
     const BigReal rest = x - turns * half_pi;
-    if (!rest.IsZero()) *lost_bits = std::max(-rest.Exponent() - BigReal::kLimbBits, 0L);
+    *lost_bits = std::max(-rest.Exponent() - BigReal::kLimbBits, 0L);
     const Angle angle = SineAndCosine(rest.Magnitude().WithLimbs(limbs));
     const BigReal sine = rest.IsNegative() ? angle.sine.Negated() : angle.sine;
     switch (quarter) {

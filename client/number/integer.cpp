@@ -94,16 +94,14 @@ Errno ToInt64(const OCINumber& value, std::int64_t* result) noexcept { return To
 
 Errno ToUint64(const OCINumber& value, std::uint64_t* result) noexcept { return ToBounded(value, result); }
 
-Errno FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept {
-    const Width* width = FindWidth(length);
-    if (!width) return errors::kBadIntegerLength;
-    width->read[is_signed](value, result);
-    return 0;
+bool IsIntegerLength(std::size_t length) noexcept { return FindWidth(length) != nullptr; }
+
+void FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept {
+    FindWidth(length)->read[is_signed](value, result);
 }
 
 Errno ToInteger(const OCINumber& value, std::size_t length, bool is_signed, void* result) noexcept {
-    const Width* width = FindWidth(length);
-    return width ? width->write[is_signed](value, result) : errors::kBadIntegerLength;
+    return FindWidth(length)->write[is_signed](value, result);
 }
 
 }  // namespace number

@@ -29,7 +29,7 @@ bool TakeValue(std::string_view* text, std::string_view* value) {
     const std::size_t end = text->find(quotes.empty() ? " " : quotes);
     if (end == std::string_view::npos && !quotes.empty()) return false;
     *value = text->substr(0, end);
-    text->remove_prefix(std::min(text->size(), value->size() + quotes.size()));
+    text->remove_prefix(value->size() + quotes.size());
     return true;
 }
 

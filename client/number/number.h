@@ -80,8 +80,9 @@ void FromInt64(std::int64_t value, OCINumber* result) noexcept;
 void FromUint64(std::uint64_t value, OCINumber* result) noexcept;
 Errno ToInt64(const OCINumber& value, std::int64_t* result) noexcept;
 Errno ToUint64(const OCINumber& value, std::uint64_t* result) noexcept;
-// The same for 1, 2, 4 or 8 bytes in native order, which need no alignment; another length is kBadIntegerLength.
-Errno FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept;
+// The same for 1, 2, 4 or 8 bytes in native order, which need no alignment.
+bool IsIntegerLength(std::size_t length) noexcept;
+void FromInteger(const void* value, std::size_t length, bool is_signed, OCINumber* result) noexcept;
 Errno ToInteger(const OCINumber& value, std::size_t length, bool is_signed, void* result) noexcept;
 
 // Reals. From: the shortest decimal that reads back as the same real; an infinity is kNumberOverflow, a NaN kBadNumber.

@@ -28,7 +28,7 @@ Errno UnpackPositive(const OCINumber& value, Digits* digits) {
 
 bool IsOdd(const Digits& digits) {
     const int units = digits.exponent;  // the index of the units digit
-    return units >= 0 && units < kMantissaDigits && DigitAt(digits, units) % 2 == 1;
+    return units < kMantissaDigits && DigitAt(digits, units) % 2 == 1;
 }
 
 // base^exponent = e^(exponent log base) for a base that is not 0. An error of the product is one of the result as often

@@ -37,9 +37,8 @@ public:
         return root;
     }
 
-    // What a division by `divisor`, which is not 0, leaves.
+    // What a division by `divisor`, which is not 0 and not larger, leaves.
     [[nodiscard]] Whole Rest(const Whole& divisor) const {
-        if (count_ < divisor.count_) return *this;
         Whole rest;
         mp_limb_t quotient[kMaxLimbs];
         rest.count_ = divisor.count_;
@@ -67,7 +66,7 @@ private:
     void Append(std::uint64_t factor, std::uint64_t low) {
         if (count_ == 0) {
             limbs_[0] = low;
-            count_ = low != 0;
+            count_ = 1;
             return;
         }
         const mp_limb_t carry = mpn_mul_1(limbs_, limbs_, count_, factor) + mpn_add_1(limbs_, limbs_, count_, low);
@@ -103,11 +102,9 @@ Errno Mod(const OCINumber& left, const OCINumber& right, OCINumber* result) noex
     if (const Errno error = Unpack(right, &b)) return error;
     if (b.IsZero()) return errors::kDividedByZero;
     if (CompareMagnitude(a, b) < 0) return Pack(a, result);
-    const int weight = std::min(a.exponent, b.exponent) - (kMantissaDigits - 1);
-    Whole dividend(a), divisor(b);
-    dividend.Scale(a.exponent - (kMantissaDigits - 1) - weight);
-    divisor.Scale(b.exponent - (kMantissaDigits - 1) - weight);
-    Digits rest = dividend.Rest(divisor).TakeDigits(weight);
+    Whole dividend(a);
+    dividend.Scale(a.exponent - b.exponent);
+    Digits rest = dividend.Rest(Whole(b)).TakeDigits(b.exponent - (kMantissaDigits - 1));
     rest.negative = a.negative;
     return Pack(rest, result);
 }
