@@ -22,9 +22,7 @@ int AstronomicalYear(int year) { return year > 0 ? year : year + 1; }
 int CalendarYear(int astronomical_year) { return astronomical_year > 0 ? astronomical_year : astronomical_year - 1; }
 
 bool IsGregorian(int year, int month, int day) {
-    if (year != kReformYear) return year > kReformYear;
-    if (month != kReformMonth) return month > kReformMonth;
-    return day > kLastJulianDay;
+    return std::tuple(year, month, day) > std::tuple(kReformYear, kReformMonth, kLastJulianDay);
 }
 
 bool IsLeap(int year) {
@@ -97,8 +95,7 @@ Errno ValidateDate(const DateTime& value) noexcept {
 Errno ValidateTime(const DateTime& value) noexcept {
     if (value.hour > 23) return errors::kBadHour;
     if (value.minute > 59) return errors::kBadMinute;
-    if (value.second > 59) return errors::kBadSecond;
-    return value.nanosecond > 999'999'999 ? errors::kBadFraction : 0;
+    return value.second > 59 ? errors::kBadSecond : 0;
 }
 
 Errno Validate(const DateTime& value) noexcept {
@@ -180,16 +177,15 @@ Errno NextDay(const DateTime& value, int day_of_week, DateTime* result) noexcept
     return AddDays(value, days == 0 ? 7 : days, result);
 }
 
-// A month of 0 is a time without a date.
 Errno RoundFraction(const DateTime& value, int digits, DateTime* result) noexcept {
-    if (const Errno number = value.month == 0 ? ValidateTime(value) : Validate(value)) return number;
+    if (const Errno number = Validate(value)) return number;
     constexpr std::uint32_t kSecond = 1'000'000'000;
     std::uint32_t unit = kSecond;
-    for (int place = 0; place < digits && unit > 1; ++place) unit /= 10;
+    for (int place = 0; place < digits; ++place) unit /= 10;
     const std::uint32_t rounded = (value.nanosecond + unit / 2) / unit * unit;
     DateTime moved = value;
     moved.nanosecond = rounded % kSecond;
-    if (rounded == kSecond && AddSecond(&moved) && moved.month != 0) {
+    if (rounded == kSecond && AddSecond(&moved)) {
         if (const Errno number = AddDays(moved, 1, &moved)) return number;
     }
     *result = moved;

@@ -65,7 +65,7 @@ Errno MoveMonths(const DateTime& value, std::int64_t months, DateTime* result) n
 Errno LastDay(const DateTime& value, DateTime* result) noexcept;
 Errno NextDay(const DateTime& value, int day_of_week, DateTime* result) noexcept;          // 0 is Sunday
 // Rounds the fraction half up to `digits` places, 0 to 9. A full second is carried into the time, the date and the
-// year (1841 behind the last second of 9999); a time without a date goes on from midnight.
+// year (1841 behind the last second of 9999).
 Errno RoundFraction(const DateTime& value, int digits, DateTime* result) noexcept;
 std::int32_t DaysBetween(const DateTime& left, const DateTime& right) noexcept;            // times of day ignored
 // -1, 0, 1 by date, time and fraction as they stand; zones are date/zone.h's.

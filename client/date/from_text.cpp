@@ -31,9 +31,9 @@ bool TakesNumber(const Element& element) {
     return element.numeric || element.field == Field::fraction || element.field == Field::zone_hour ||
            element.field == Field::zone_minute || element.field == Field::comma_year;
 }
+// Of what takes no number.
 bool TakesWord(const Element& element) {
-    return !TakesNumber(element) && element.field >= Field::year && element.field != Field::radix &&
-           element.field != Field::zone_region;
+    return element.field >= Field::year && element.field != Field::radix && element.field != Field::zone_region;
 }
 bool MayBeMissing(const Element& element) { return element.field >= Field::half_day; }
 

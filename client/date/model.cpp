@@ -87,7 +87,7 @@ constexpr Row kRows[] = {
     {"Y", Field::year, 1, kNumeric},
 };
 
-bool IsMark(char c) { return c == ' ' || (c > ' ' && c < '\x7f' && !letters::IsLetter(c) && !letters::IsDigit(c)); }
+bool IsMark(char c) { return c >= ' ' && c < '\x7f' && !letters::IsLetter(c) && !letters::IsDigit(c); }
 
 LetterCase CaseOf(std::string_view written) {
     if (written.front() != letters::ToUpper(written.front())) return LetterCase::lower;

@@ -113,7 +113,7 @@ public:
 
     const Region* Get(std::uint16_t number) {
         const std::shared_lock lock(mutex_);
-        return number == 0 || number > all_.size() ? nullptr : all_[number - 1U].get();
+        return number == 0 ? nullptr : all_[number - 1U].get();
     }
 
 private:
@@ -194,10 +194,14 @@ void SetOffset(int minutes, std::uint16_t region, DateTime* value) {
     value->region = region;
 }
 
+// The offset in force in a zone at a value's local time; that of today for a time without a date.
+int OffsetAt(const ZoneRules& rules, const DateTime& value) {
+    return OffsetMinutes(value.month == 0 ? rules.At(std::time(nullptr)) : rules.AtWallTime(WallSeconds(value)));
+}
+
 std::int64_t MomentSeconds(const DateTime& value) {
-    const std::int64_t wall = WallSeconds(value);
-    const int minutes = value.has_zone ? value.zone_minutes : OffsetMinutes(ProcessZone().AtWallTime(wall));
-    return wall - minutes * std::int64_t{60};
+    const int minutes = value.has_zone ? value.zone_minutes : OffsetAt(ProcessZone(), value);
+    return WallSeconds(value) - minutes * std::int64_t{60};
 }
 
 Errno MoveSeconds(std::int64_t seconds, DateTime* value) {
@@ -225,8 +229,7 @@ Errno SetWrittenOffset(std::string_view text, DateTime* value) {
 Errno SetRegion(std::string_view name, DateTime* value) {
     const std::uint16_t number = TheRegions().Find(name);
     if (number == 0) return errors::kNoSuchZone;
-    const ZoneRules& rules = TheRegions().Get(number)->rules;
-    SetOffset(OffsetMinutes(rules.AtWallTime(WallSeconds(*value))), number, value);
+    SetOffset(OffsetAt(TheRegions().Get(number)->rules, *value), number, value);
     return 0;
 }
 
@@ -244,7 +247,7 @@ Errno SetOffset(bool west, int hours, int minutes, DateTime* value) noexcept {
 Errno SetZone(std::string_view zone, DateTime* value) noexcept {
     return Guarded([&]() -> Errno {
         if (zone.empty()) {
-            SetOffset(OffsetMinutes(ProcessZone().AtWallTime(WallSeconds(*value))), 0, value);
+            SetOffset(OffsetAt(ProcessZone(), *value), 0, value);
             return 0;
         }
         return zone.front() == '+' || zone.front() == '-' ? SetWrittenOffset(zone, value) : SetRegion(zone, value);
@@ -258,7 +261,8 @@ std::string_view RegionName(const DateTime& value) noexcept {
 
 std::string_view ZoneAbbreviation(const DateTime& value) noexcept {
     const Region* region = TheRegions().Get(value.region);
-    return region ? region->rules.At(MomentSeconds(value)).abbreviation : std::string_view();
+    if (!region) return {};
+    return region->rules.At(value.month == 0 ? std::time(nullptr) : MomentSeconds(value)).abbreviation;
 }
 
 Errno CompareMoments(const DateTime& left, const DateTime& right, int* order) noexcept {

@@ -126,7 +126,7 @@ ZoneState RecurringRules::At(std::int64_t moment) const {
     const int year = YearOf(moment + standard_offset_);
     const std::int64_t begin = to_summer_.WallTime(year) - standard_offset_;
     const std::int64_t end = to_standard_.WallTime(year) - summer_offset_;
-    if (begin < end) return moment >= begin && moment < end ? summer : standard;
+    if (begin <= end) return moment >= begin && moment < end ? summer : standard;
     return moment >= end && moment < begin ? standard : summer;    // south of the equator
 }
 
@@ -181,7 +181,7 @@ private:
             if (value < 0 || value > static_cast<std::int64_t>(kLimit)) return false;
             *count = static_cast<std::size_t>(value);
         }
-        return counts->type > 0 && counts->type <= 256 && counts->letter > 0 && counts->letter <= 256;
+        return counts->type > 0;
     }
 
     bool ReadBlock(const Counts& counts, std::size_t time_size, ZoneRules* rules) {

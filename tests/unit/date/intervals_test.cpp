@@ -51,7 +51,8 @@ TEST_F(IntervalCalls, TextsAreReadAndWritten) {
         {false, "-0 0:0:0.999999999", 2, 9, "-00 00:00:00.999999999"}, {false, "5", 1, 1, "+5 00:00:00.0"},
         {false, "9 23:59:59.95", 1, 1, "1873"}, {false, "9 23:59:59.95", 2, 1, "+10 00:00:00.0"},
         {false, "9 23:59:59.94", 1, 1, "+9 23:59:59.9"}, {false, "999999999 23:59:59.9", 9, 0, "1873"},
-        {false, "-0 0:0:0.4", 2, 0, "+00 00:00:00"}, {false, "5", 1, 10, "30088"}, {false, "1 2:x", 1, 0, "1867"}};
+        {false, "-0 0:0:0.4", 2, 0, "+00 00:00:00"}, {false, "5", 1, 10, "30088"}, {false, "1 2:x", 1, 0, "1867"},
+        {false, "1 2:3:x", 1, 0, "1867"}, {false, "1 2:3:4.", 1, 0, "1880"}, {false, "1 2:3:4.1234567890", 1, 0, "1880"}};
     for (const auto& c : cases) {
         sb4 number = 0;
         const OCIInterval* interval = Read(c.text, c.months, &number);
@@ -216,19 +217,54 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     auto* plain = Moment("2024-07-15 00:00:00.5", OCI_DTYPE_TIMESTAMP);
     EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, plain, &hour, &minute)), 1878);
     auto* date = NewDescriptor<OCIDateTime>(OCI_DTYPE_DATE);
-    EXPECT_EQ(Answer(OCIDateTimeConvert(env_, err_, Moment("2024-07-15 10:00:00.5 +01:00"), date)), 0);
-    EXPECT_EQ(Shown(date, ""), "15-JUL-24");
     EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, date, 2024, 7, 16, 13, 14, 15, 0, nullptr, 0)), 0);
     EXPECT_EQ(Shown(date, "DD HH24:MI:SS"), "16 00:00:00");
     EXPECT_EQ(Shown(date, "FF"), "1821");
     EXPECT_EQ(Answer(OCIDateTimeFromText(env_, err_, Text("5"), 1, Text("FF"), 2, nullptr, 0, date)), 1821);
     auto* time = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIME);
-    EXPECT_EQ(Shown(time, "MI"), "1866");
     EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, time, 7, 8, 9, 0)), 0);
     EXPECT_EQ(Shown(time, "PM HH24:MI:SS SSSSS FF \"x\""), "AM 07:08:09 25689 000000000 x");
-    EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, plain, time, NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS))), 1878);
-    for (const char* model : {"YYYY", "J", "MON", "DAY", "RM", "DL", "DS \"x\"", "fmDL"})
+    for (const char* model : {"YYYY", "J", "MON", "DAY", "RM", "DL", "DS \"x\"", "fmDL", "DL TZH"})
         EXPECT_EQ(Shown(time, model), "1878") << model;
+}
+
+// Which parts each type has, and what it drops.
+TEST_F(IntervalCalls, TypesOfMoments) {
+    auto* tokyo = Moment("2024-07-15 10:20:30.5 Asia/Tokyo");
+    const struct { ub4 type; const char *made, *converted; sb4 date, time, compared, zone, moved; } cases[] = {
+        {OCI_DTYPE_DATE, "16-JUL-24", "15-JUL-24", 0, 1878, 0, 1878, 0},
+        {OCI_DTYPE_TIME, "01.14.15.000000 PM", "10.20.30.500000 AM", 1878, 0, 1870, 1878, 1878},
+        {OCI_DTYPE_TIME_TZ, "01.14.15.000000 PM Asia/Tokyo", "10.20.30.500000 AM Asia/Tokyo", 1878, 0, 1870, 0, 1878},
+        {OCI_DTYPE_TIMESTAMP, "16-JUL-24 01.14.15.000000 PM", "15-JUL-24 10.20.30.500000 AM", 0, 0, 0, 1878, 0},
+        {OCI_DTYPE_TIMESTAMP_LTZ, "16-JUL-24 01.14.15.000000 PM", nullptr, 0, 0, 0, 0, 0}};    // by the zone of the process
+    for (const auto& c : cases) {
+        auto* value = NewDescriptor<OCIDateTime>(c.type);
+        ub4 flags = 0, fraction = 0;
+        sb2 year = 0;
+        ub1 month = 0, day = 0, second = 0;
+        sb1 hour = 0, minute = 0;
+        sword order = 0;
+        EXPECT_EQ(Answer(OCIDateTimeCheck(env_, err_, value, &flags)), 0);
+        EXPECT_EQ(flags != 0, c.date == 0) << c.type;
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), 1866);
+        EXPECT_EQ(Answer(OCIDateTimeIntervalAdd(env_, err_, value, Read("1"), value)), 1866);
+        EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, value, 2024, 7, 16, 13, 14, 15, 0, Text("Asia/Tokyo"), 10)), 0);
+        EXPECT_EQ(Shown(value, "", 6), c.made);
+        EXPECT_EQ(Answer(OCIDateTimeConvert(env_, err_, tokyo, value)), 0);
+        if (c.converted) EXPECT_EQ(Shown(value, "", 6), c.converted);
+        EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, 2025, 1, 15)), c.date);
+        EXPECT_EQ(Answer(OCIDateTimeGetDate(env_, err_, value, &year, &month, &day)), c.date);
+        EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 0)), c.time);
+        EXPECT_EQ(Answer(OCIDateTimeGetTime(env_, err_, value, &month, &day, &second, &fraction)), c.time);
+        EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, value, tokyo, &order)), c.compared);
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), c.zone);
+        if (c.type == OCI_DTYPE_TIME_TZ) EXPECT_EQ(hour * 60 + minute, 540) << "not that of the year 0";
+        for (OCIDateTime* left : {value, tokyo}) {
+            EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, left, left == value ? tokyo : value,
+                                                 NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS))), c.moved);
+        }
+        EXPECT_EQ(Answer(OCIDateTimeIntervalAdd(env_, err_, value, Read("1"), value)), c.moved);
+    }
 }
 
 }  // namespace

@@ -95,7 +95,9 @@ TEST(ZoneRules, TextsOfRules) {
         {"XXX3YYY2,59/0,300/0", 1709175599, -10800, "XXX"},   // 59 is 29 February in leap years
         {"XXX3YYY2,59/0,300/0", 1709175600, -7200, "YYY"}, {"XXX3YYY2,M2.5.6/0,M10.5.6/0", 1708743600, -7200, "YYY"},
         {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},  // J60 is 1 March in leap years, too
-        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"}, {"XXX0YYY-1,J365/12,100", 1735639200, 0, "XXX"},
+        {"XXX3YYY2,J60/0,300/0", 1709262000, -7200, "YYY"}, {"XXX0YYY-1,J365/12,100", 1735639200, 0, "XXX"}, {"XXX167", 0, -601200, "XXX"},
+        {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1728144000, 39600, "AEDT"}, {"XXX3YYY2,M1.1.0/0,M12.1.0/0", 1704596400, -7200, "YYY"},
+        {"XXX3YYY2,1/1,1/2", 90000, -10800, "XXX"},           // ends as it begins
     };
     for (const auto& c : cases) {
         const auto rules = ZoneRules::FromText(c.text);
@@ -105,7 +107,7 @@ TEST(ZoneRules, TextsOfRules) {
     }
     for (const char* text : {"", "UTC", "5", "CET-1CEST,", "CET-1CEST,M3.5.0", "CET-1CEST,M3.5.0,M10.5.0x", "CET-1CEST,M13.5.0,M10.5.0",
                              "CET-1CEST,M3.6.0,M10.5.0", "CET-1CEST,M3.6,M10.5.0", "CET-1CEST,M3.0.0,M10.5.0",
-                             "CET-1CEST,M0.5.0,M10.5.0", "CET-1CEST,M3.5.7,M10.5.0", "CET-1CEST,366,M10.5.0",
+                             "CET-1CEST,M3..0,M10.5.0", "CET-1CEST,M3.5,M10.5.0", "XXX168", "LMT0:", "CET-1CEST,M0.5.0,M10.5.0", "CET-1CEST,M3.5.7,M10.5.0", "CET-1CEST,366,M10.5.0",
                              "CET-1CEST,J366,M10.5.0", "<CET-1", "CET-999", "UTC0x", "LMT0:60", "LMT0:0:60", "LMT0:0:"}) {
         EXPECT_FALSE(ZoneRules::FromText(text)) << text;
     }
@@ -136,6 +138,7 @@ TEST(ZoneRules, SmallFiles) {
         EXPECT_EQ(rules->At(-1001).offset, 60);
         EXPECT_FALSE(ZoneRules::FromFile(bytes.substr(0, bytes.size() - 1)));
     }
+    EXPECT_FALSE(ZoneRules::FromFile("TZif" + std::string(40, '\0'))) << "without types";
 }
 
 // A process reads its zone once, so that each has a process of its own.
@@ -158,7 +161,8 @@ TEST(ZoneDeath, TheProcessHasTheZoneThatTzNames) {
 // Bytes flipped and files cut short: refused or read, without harm.
 TEST(ZoneRules, DamagedFiles) {
     const std::string good = FileBytes("/usr/share/zoneinfo/Europe/Paris");
-    for (std::size_t length = 0; length < good.size(); length += 7)
+    EXPECT_FALSE(ZoneRules::FromFile(std::string(good).replace(good.rfind('\n', good.size() - 2), 1, " ")));
+    for (std::size_t length = 0; length < good.size(); ++length)
         EXPECT_FALSE(ZoneRules::FromFile(good.substr(0, length))) << length;
     std::mt19937 random(1);
     for (int i = 0; i < 3000; ++i) {
