@@ -112,18 +112,14 @@ int StoreTruncated(const Elements& elements, std::size_t index, const Target& ta
 ColumnClass ClassOf(std::uint16_t internal_type) {
     switch (internal_type) {
         case SQLT_NUM:
-        case SQLT_VNU:
         case SQLT_BFLOAT:
         case SQLT_BDOUBLE: return ColumnClass::number;
         case SQLT_IBFLOAT: return ColumnClass::binary_float;
         case SQLT_IBDOUBLE: return ColumnClass::binary_double;
-        case SQLT_DAT:
-        case SQLT_DATE: return ColumnClass::date;
+        case SQLT_DAT: return ColumnClass::date;
         case SQLT_TIMESTAMP:
-        case SQLT_TIMESTAMP_LTZ:
-        case SQLT_TIME: return ColumnClass::timestamp;
-        case SQLT_TIMESTAMP_TZ:
-        case SQLT_TIME_TZ: return ColumnClass::timestamp_zone;
+        case SQLT_TIMESTAMP_LTZ: return ColumnClass::timestamp;
+        case SQLT_TIMESTAMP_TZ: return ColumnClass::timestamp_zone;
         default: return ColumnClass::plain;
     }
 }

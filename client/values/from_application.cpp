@@ -227,10 +227,7 @@ void Widen(Datum& datum, Workspace& workspace) {
     SetDecimal(number, workspace, datum);
 }
 
-int FromNull(const Source&, Workspace&, Datum& datum) {
-    datum.kind = Kind::null;
-    return 0;
-}
+int FromNull(const Source&, Workspace&, Datum&) { return 0; }    // the datum is null as it comes
 int FromNothing(const Source&, Workspace&, Datum&) { return errors::kInconsistentTypes; }
 
 }  // namespace values

@@ -20,7 +20,7 @@ bool TakeDigits(std::string_view text, unsigned bits, std::uint64_t* value) {
         if (digit == std::string_view::npos || *value >> (bits - 6) != 0) return false;
         *value = *value << 6 | digit;
     }
-    return bits == 64 || *value >> bits == 0;
+    return true;
 }
 
 std::string_view WithoutBlanks(std::string_view text) {

@@ -77,7 +77,7 @@ int OtherRealText(double value, Workspace& workspace, View& text) {
     char* begin = workspace.small.data();
     const char* end = std::to_chars(begin, begin + workspace.small.size(), value, std::chars_format::fixed).ptr;
     const bool negative = *begin == '-';
-    if (begin[negative] == '0' && begin + negative + 1 < end) {    // no zero stands before the point
+    if (begin[negative] == '0') {    // no zero stands before the point
         ++begin;
         if (negative) *begin = '-';
     }
@@ -158,7 +158,7 @@ std::size_t ShortDate(const date::DateTime& value, char* text) {
 int ModelText(const date::DateTime& value, Workspace& workspace, View& text) {
     std::size_t length = 0;
     char* begin = workspace.small.data();
-    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0 && value.month <= 12) {
+    if (ModelOf(workspace.column).data() == date::kDateModel.data() && value.year > 0) {
         text = {begin, ShortDate(value, begin)};
         return 0;
     }
