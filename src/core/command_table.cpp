@@ -74,7 +74,6 @@ void HandlerTable::Set(const CommandRow& row, void (*run)(const CommandRow&, int
 }
 
 const HandlerTable::Handler* HandlerTable::Find(Code code) const {
-    if (!IsCommand(code)) return nullptr;
     const Handler& handler = handlers_[static_cast<int>(code)];
     return handler.row == nullptr ? nullptr : &handler;
 }

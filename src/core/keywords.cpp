@@ -27,7 +27,6 @@ const KeywordTable* FindRow(std::string_view word, const KeywordTable* table, Ma
     for (size_t index = 0; index < word.size(); ++index)
         folded[index] = static_cast<char>(std::tolower(static_cast<unsigned char>(word[index])));
     for (const KeywordTable* row = table; row->keyword != nullptr; ++row) {
-        if (row->keyword[0] == '\0') continue;
         if (std::strncmp(folded, row->keyword, word.size()) != 0) continue;
         if (match == Match::beginning || row->keyword[word.size()] == '\0') return row;
     }

@@ -70,14 +70,14 @@ Line& Line::Format(const char* format, ...) {
     va_start(arguments, format);
     va_list again;
     va_copy(again, arguments);
-    const int length = std::vsnprintf(room, sizeof room, format, arguments);
+    const auto length = static_cast<size_t>(std::vsnprintf(room, sizeof room, format, arguments));
     va_end(arguments);
-    if (length > 0 && static_cast<size_t>(length) < sizeof room) {
-        text_.append(room, static_cast<size_t>(length));
-    } else if (length > 0) {
+    if (length < sizeof room) {
+        text_.append(room, length);
+    } else {
         const size_t start = text_.size();
-        text_.resize(start + static_cast<size_t>(length) + 1);
-        std::vsnprintf(text_.data() + start, static_cast<size_t>(length) + 1, format, again);
+        text_.resize(start + length + 1);
+        std::vsnprintf(text_.data() + start, length + 1, format, again);
         text_.pop_back();
     }
     va_end(again);

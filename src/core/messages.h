@@ -43,7 +43,6 @@ public:
     std::string_view View() const { return text_; }
     size_t Length() const { return text_.size(); }
     bool Empty() const { return text_.empty(); }
-    void Clear() { text_.clear(); }
 
 private:
     std::string text_;

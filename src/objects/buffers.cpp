@@ -51,24 +51,18 @@ void NoteUse(const MemBuffer& buffer) {
         if (&buffers[slot] == &buffer) used_slots = slot + 1;
 }
 
-// A record as a new one begins, without its blocks.
+// A record as a new one begins, without its blocks: those of the last one have been given back.
 void BeginRecord(MemBuffer& buffer, void* statement, const ElementShape& shape, uint32_t array_size) {
     NoteUse(buffer);
     buffer.statement = statement;
-    buffer.data = nullptr;
-    buffer.call_data = nullptr;
     buffer.element_size = buffer.call_length = buffer.created_size = shape.size;
     buffer.created_type = buffer.type = static_cast<uint16_t>(shape.type);
     buffer.precision = shape.precision;
     buffer.scale = shape.scale;
-    buffer.indicators = buffer.call_indicators = nullptr;
-    buffer.lengths = buffer.call_lengths = nullptr;
-    buffer.return_codes = buffer.call_return_codes = nullptr;
     buffer.array_size = array_size;
     buffer.dynamic = {};
     buffer.holds_pointers = false;
     buffer.current_element = 0;
-    buffer.viewed = nullptr;
 }
 
 void SetCallPointers(MemBuffer& buffer) {

@@ -117,8 +117,7 @@ NamedDescriptor* AsDescriptor(Kind kind, NamedObject* slot) {
 }
 
 Slots SlotsOf(Kind kind) {
-    const auto index = static_cast<size_t>(kind);
-    return index < kHandleKinds ? kTables[index].slots : Slots();
+    return kTables[static_cast<size_t>(kind)].slots;
 }
 
 void* InvalidObject() {

@@ -90,7 +90,6 @@ public:
         size_t stride_;
     };
 
-    constexpr Slots() = default;
     template <class Record, size_t kCount>
     explicit constexpr Slots(Record (&slots)[kCount]) : first_(slots), count_(kCount), stride_(sizeof(Record)) {}
     Iterator begin() const { return {first_, stride_}; }
@@ -99,11 +98,11 @@ public:
     }
 
 private:
-    NamedObject* first_ = nullptr;
-    size_t count_ = 0;
-    size_t stride_ = 0;
+    NamedObject* first_;
+    size_t count_;
+    size_t stride_;
 };
-// None for kinds whose tables are elsewhere.
+// Not of kinds whose tables are elsewhere.
 Slots SlotsOf(Kind kind);
 
 // A deliberately bad object: a static, writable 15-byte text "Invalid buffer".

@@ -86,7 +86,6 @@ uint64_t LayOut(std::span<const ElementShape> shapes, StructMember* members) {
         member.indicator_offset = layout.Take(sizeof(int16_t), alignof(int16_t));
         member.length_offset = layout.Take(sizeof(uint16_t), alignof(uint16_t));
         member.return_code_offset = layout.Take(sizeof(uint16_t), alignof(uint16_t));
-        member.current_element = 0;
     }
     return layout.RowSize();
 }
@@ -151,7 +150,6 @@ bool AllocateStruct(MemStruct& record, void* statement, std::span<const ElementS
     record.statement = statement;
     record.array_size = array_size;
     record.member_count = static_cast<uint32_t>(members.size());
-    record.rows = nullptr;
     record.members = static_cast<StructMember*>(GetMem(members.size() * sizeof(StructMember)));
     if (record.members != nullptr) {
         const uint64_t row_size = LayOut(members, record.members);

@@ -79,7 +79,7 @@ int convertToUTF16(const char* input, uint32_t input_length, char* output, uint3
         Message(kError, "CodePageConvert failed with rc - %ld\n", static_cast<long>(rc));
         return rc;
     }
-    *output_length = static_cast<uint32_t>(capacity - std::min<size_t>(unused, capacity));
+    *output_length = static_cast<uint32_t>(capacity - unused);
     if (!quiet) SayConverted(input_length, *output_length);
     return rc;
 }
@@ -112,7 +112,6 @@ bool AddText(Line& line, const void* text, size_t length, bool utf16, Quotes quo
 // --- Text arguments ------------------------------------------------------------------------------------------------
 
 bool TextArgument::Set(const char* word, long length, TextArea area) {
-    text_ = nullptr;
     length_ = static_cast<uint32_t>(length);
     if (word == nullptr || IsNull(word)) return true;
     if (Utf16Mode) return Convert(word, length_, area);
@@ -124,7 +123,6 @@ bool TextArgument::SetWords(char** words, TextArea area) {
 }
 
 bool TextArgument::SetBytes(const char* word, long length) {
-    text_ = nullptr;
     length_ = static_cast<uint32_t>(length);
     return word == nullptr || Pass(word);
 }
@@ -137,13 +135,14 @@ bool TextArgument::Pass(const char* word) {
     return true;
 }
 
+// A length beyond the token buffer.
 bool TextArgument::Pad(const char* word, const char*& padded) {
     padded_.reset(static_cast<char*>(GetMem(length_)));
     if (padded_ == nullptr) {
         Message(kError, "Could not allocate memory\n");
         return false;
     }
-    std::memcpy(padded_.get(), word, std::min<size_t>(kTokenBufferSize, length_));
+    std::memcpy(padded_.get(), word, kTokenBufferSize);
     padded = padded_.get();
     return true;
 }

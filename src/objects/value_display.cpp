@@ -67,7 +67,7 @@ struct DisplayIndex {
         for (const TypeDisplay& row : kTypeDisplays) shows[row.type] = row.show;
     }
     // Null where a type has no display.
-    Show Find(int type) const { return type < 0 || type > SQLT_TIMESTAMP_LTZ ? nullptr : shows[type]; }
+    Show Find(int type) const { return type > SQLT_TIMESTAMP_LTZ ? nullptr : shows[type]; }
 };
 constexpr DisplayIndex kDisplayIndex;
 

@@ -46,6 +46,6 @@ NamedXid* TakeXidSlot(const char* name) {
 XID* ResolveXid(const char* name) {
     if (IsInvalid(name)) return InvalidXid();
     if (NamedXid* const slot = FindXid(name)) return &slot->xid;
-    if (!IsNull(name)) Message(kError, "Handle %s not found\n", name);
+    Message(kError, "Handle %s not found\n", name);
     return nullptr;
 }

@@ -19,6 +19,6 @@ NamedXid* FindXid(const XID& xid);
 // The next slot, under the name; null when all are taken.
 NamedXid* TakeXidSlot(const char* name);
 
-// The identifier that an argument stands for: "invalid" an area that holds "Invalid buffer", "null" a null pointer; an
-// unknown name prints "Handle %s not found\n" and gives a null pointer.
+// The identifier that a word other than "null" stands for: "invalid" an area that holds "Invalid buffer"; an unknown name
+// prints "Handle %s not found\n" and gives a null pointer.
 XID* ResolveXid(const char* name);

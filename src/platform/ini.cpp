@@ -78,7 +78,7 @@ std::size_t IniReadString(const char* file, const char* section, const char* key
     if (!key) return CopyKeys(IniReadSection(file, section, capacity), buffer, capacity);
     const IniText ini = LoadIni(file);
     const std::string* const value = ini.Find(section, key);
-    return CopyText(value ? *value : otherwise ? otherwise : "", buffer, capacity);
+    return CopyText(value ? *value : otherwise, buffer, capacity);
 }
 
 std::vector<IniSetting> IniReadSection(const char* file, const char* section, std::size_t most_key_bytes) {

@@ -9,7 +9,7 @@
 #include <string>
 #include <vector>
 
-// Copies the value, or `otherwise` (null: the empty text) where there is none, cut to the capacity and terminated.
+// Copies the value, or `otherwise` where there is none, cut to the capacity and terminated.
 // With a null key, all keys of the section in the order of the file, each ended by a NUL, and an empty one: keys that
 // do not fit whole are left out. Answers the bytes written, the closing NUL not counted.
 std::size_t IniReadString(const char* file, const char* section, const char* key, const char* otherwise, char* buffer,

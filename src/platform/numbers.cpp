@@ -9,11 +9,11 @@
 static_assert(sizeof(long long) == sizeof(std::int64_t));
 
 std::int64_t StrToInt64(const char* text) {
-    return text ? std::strtoll(text, nullptr, 10) : 0;
+    return std::strtoll(text, nullptr, 10);
 }
 
 std::uint64_t StrToUint64(const char* text) {
-    return text ? std::strtoull(text, nullptr, 10) : 0;
+    return std::strtoull(text, nullptr, 10);
 }
 
 void SleepMilliseconds(std::int64_t milliseconds) {

@@ -1,5 +1,5 @@
 // Reading decimal numbers: optional leading blanks and sign, then digits up to the first other character; 0 when there
-// are none or the text is null. A number out of range is the nearest one in range. Also a sleep. Any thread.
+// are none. A number out of range is the nearest one in range. Also a sleep. Any thread.
 #pragma once
 
 #include <cstdint>

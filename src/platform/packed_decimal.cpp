@@ -169,7 +169,7 @@ int DecimalToText(const unsigned char* packed, std::uint32_t precision, std::int
 
 int TextToDecimal(const char* text, unsigned char* packed, std::uint32_t precision, std::int32_t scale) {
     Decimal decimal;
-    if (!text || !ReadDecimal(text, decimal)) return kDecimalBadText;
+    if (!ReadDecimal(text, decimal)) return kDecimalBadText;
     const std::int64_t count = decimal.digits.empty() ? 0 : decimal.point + scale;
     if (count > precision) return kDecimalOverflow;
     const std::string digits = Rounded(decimal.digits, count);

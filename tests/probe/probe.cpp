@@ -305,17 +305,18 @@ std::string Bytes(const std::string& digits) {
     return bytes;
 }
 
-// read:PIECE:BYTES delivers a piece of a LOB, write:ROOM asks for one.
+// read:PIECE:BYTES delivers a piece of a LOB, read:PIECE one that is not there; write:ROOM asks for one, write:ROOM:TOLD
+// and tells of another room, write:0 without any.
 void CallRead(State& state, const Words& words) {
-    const std::string bytes = Bytes(words.size() > 2 ? words[2] : "");
-    const sb4 rc = state.installed.read(state.installed.lob_context, bytes.data(), static_cast<ub4>(bytes.size()),
-                                        Number<ub1>(words, 1));
+    const std::string bytes = words.size() > 2 ? Bytes(words[2]) : "nowhere";
+    const sb4 rc = state.installed.read(state.installed.lob_context, words.size() > 2 ? bytes.data() : nullptr,
+                                        static_cast<ub4>(bytes.size()), Number<ub1>(words, 1));
     Print(state, Answered("read callback", rc) + "\n");
 }
 
 void CallWrite(State& state, const Words& words) {
     std::vector<char> room(Number(words, 1));
-    auto length = static_cast<ub4>(room.size());
+    auto length = words.size() > 2 ? Number(words, 2) : static_cast<ub4>(room.size());
     ub1 piece = 255;
     const sb4 rc = state.installed.write(state.installed.lob_context, room.data(), &length, &piece);
     std::string line = Answered("write callback", rc);

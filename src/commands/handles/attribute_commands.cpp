@@ -61,11 +61,10 @@ void* AttributeHandle::Parent() const {
 
 // --- Shapes ----------------------------------------------------------------------------------------------------------
 
-// What the library has put into the area; of texts the length.
+// What the library has put into the area; of texts the length, which is 0 where it was given no place for it.
 struct Reading {
     alignas(XID) unsigned char area[kAreaSize] = {};
     ub4 size = 0;
-    bool has_size = true;  // false: the library was given no place for it
     OCIError* error = nullptr;
 
     template <class T> T As() const { return ReadElement<T>(area, sizeof area); }
@@ -156,7 +155,7 @@ void PrintSevenByteDate(const Reading& reading) {
 // The bytes come with the count in front, 22 in all, or without it. The count itself tells where the size does not.
 OCINumber NumberOf(const ub1* bytes, const Reading& reading) {
     OCINumber number{};
-    const bool counted = !reading.has_size || reading.size == 0 || reading.size >= sizeof number;
+    const bool counted = reading.size == 0 || reading.size >= sizeof number;
     const size_t digits = std::min(counted ? bytes[0] : reading.size, ub4{sizeof number - 1});
     number.OCINumberPart[0] = static_cast<ub1>(digits);
     std::memcpy(number.OCINumberPart + 1, counted ? bytes + 1 : bytes, digits);
@@ -243,10 +242,9 @@ void GetAttribute(const CommandRow& row, int, char** words) {
     void* value = IsNull(words[3]) ? nullptr : reading.area;
     if (shape.kind) value = object.Place();
     else if (attribute.shape == Shape::rowid) value = ResolveObject(Kind::rowid, words[3]);
-    reading.has_size = !IsNull(words[4]);
     reading.error = ResolveError<OCIError>(words[6]);
     const sword rc = Call(&ClientLibrary::OCIAttrGet, handle.object, static_cast<ub4>(handle.type), value,
-                          reading.has_size ? &reading.size : nullptr, attribute.number, reading.error);
+                          IsNull(words[4]) ? nullptr : &reading.size, attribute.number, reading.error);
     TraceAndReport(row.code, words[1], reading.error, rc);
     if (rc != OCI_SUCCESS || value == nullptr) return;
     if (shape.kind) object.EnterAnew(*shape.kind, handle.Parent());

@@ -105,7 +105,6 @@ void PrintNumber(const OCINumber& value, OCIError* error) {
     if (rc != OCI_SUCCESS) return ReturnCodeReport(error, rc);
 
     const size_t size = std::min<size_t>(length, sizeof text);
-    line.Clear();
     if (Utf16Mode) {
         std::string converted;
         if (!convertFromUTF16(text, size, converted)) return;

@@ -6,6 +6,7 @@
 #include <string>
 
 #include "platform/code_page.h"
+#include "platform/code_page_table.h"
 
 namespace {
 
@@ -43,7 +44,8 @@ TEST(CodePages, KnownBytesBothWays) {
         {949, "\x81\x41", "갂"}, {954, "\xA4\xA2", "あ"}, {964, "\xC4\xE3", "中"}, {970, "\xB0\xA1", "가"},
         {1026, "\x5A", "Ğ"}, {1047, "\xAD\xBD", "[]"}, {1089, "\xD9", "ع"}, {1140, "\xBA\x9F", "[€"},
         {1141, "\x4A\x9F", "Ä€"}, {1148, "\x4A\x9F", "[€"}, {1386, "\x81\x40", "丂"}, {5488, "\x94\x32\xBE\x34", "𝄞"},
-        {54936, "\xD6\xD0\x94\x32\xBE\x34", "中𝄞"}, {1202, "\x34\xD8\x1E\xDD", "𝄞"}, {1200, "\xD8\x34\xDD\x1E", "𝄞"}};
+        {54936, "\xD6\xD0\x94\x32\xBE\x34", "中𝄞"}, {1202, "\x34\xD8\x1E\xDD", "𝄞"}, {1200, "\xD8\x34\xDD\x1E", "𝄞"},
+        {1202, "\0\x08\0\xE0\0\xD8\0\xDC"s, "\u0800\uE000\U00010000"}};  // where longer forms begin
     for (const auto& c : cases) {
         const Converted there = Convert(c.page, 1208, c.bytes);
         const Converted back = Convert(1208, c.page, c.utf8);
@@ -64,6 +66,7 @@ TEST(CodePages, AreasOfEveryLength) {
         {1258, 1202, "xe\xEC" "ae\xEC"}, {1208, 37, "abcé"}, {1208, 819, "a中"},
         {1208, 943, "é中é"}, {1208, 54936, "a\xFFz"},  // substitutes that just fit
         {1208, 1202, "a\xFFz\xE4\xB8"}, {1202, 850, Convert(1208, 1202, "aй中z").output},
+        {1202, 1208, Convert(1208, 1202, "twenty-four letters here").output},
     };
     for (const auto& c : cases) {
         const Converted whole = Convert(c.source, c.target, c.input);
@@ -132,6 +135,16 @@ TEST(CodePages, UnknownPagesAndNullAreasAreRefused) {
     EXPECT_EQ(unused_input, 3u);
     EXPECT_EQ(CodePageConvert(1208, 1202, "ab", 2, nullptr, nullptr, 4, nullptr), kCodePageBadArgument);
     EXPECT_EQ(CodePageConvert(1208, 850, nullptr, 0, nullptr, nullptr, 0, nullptr), kCodePageDone);
+}
+
+TEST(CodePages, OfCharacterSets) {
+    const struct { const char* name; unsigned page; } cases[] = {
+        {"ANSI_X3.4-1968", 367}, {"ansix34-1968", 0}, {"ISO_8859-15", 923}, {"iso8859_1", 819}, {"utf8", 1208}, {"UTF-8Z", 0},
+        {"UTF", 0}, {"koi8r-", 878}, {"EUC-CN", 1381}, {"", 0}};
+    for (const auto& c : cases) {
+        const CodePage* const page = FindCharacterSet(c.name);
+        EXPECT_EQ(page ? page->number : 0, c.page) << c.name;
+    }
 }
 
 TEST(CodePages, OfTheProcess) {

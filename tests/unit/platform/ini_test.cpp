@@ -59,6 +59,10 @@ TEST_F(Ini, AreasOfEveryLength) {
         EXPECT_EQ(Read("s", nullptr, capacity), capacity < 5 ? "" : keys.substr(0, capacity < 11 ? 4 : 10)) << capacity;
     Put("[s]\nempty=\n");
     EXPECT_EQ(Read("s", "absent") + Read("s", "empty"), "none");
+    for (const std::size_t more : {0u, 1u}) {
+        Put("[s]\nk=1\n" + std::string((16u << 20) - 8 + more, ';'));
+        EXPECT_EQ(Read("s", "k"), more == 0 ? "1" : "none");
+    }
 }
 
 TEST_F(Ini, AWriteChangesOneLine) {
@@ -72,6 +76,7 @@ TEST_F(Ini, AWriteChangesOneLine) {
         {"[s]\nk=1\nk=2\n", "s", "k", "3", "[s]\nk=3\nk=2\n"},
         {"[s]\nk=1\nodd line\nk=2\n[t]\nk=3\n", "s", "K", nullptr, "[s]\nodd line\n[t]\nk=3\n"},
         {"[s]\nk=1\n", "s", "absent", nullptr, "[s]\nk=1\n"}, {"[s]\nk=\n", "s", "k", "v", "[s]\nk=v\n"},
+        {"[s]", "s", "k", "v", "[s]\nk=v\n"}, {"[s\nk=1\n", "s", "k", "v", "[s\nk=1\n\n[s]\nk=v\n"},
         {"[s]\nk=1\n", "s", "k", "", "[s]\nk=\n"}, {"k=0\n[s]\n", "", "k", "1", "k=1\n[s]\n"}};
     for (const auto& c : cases) {
         Put(c.before);
@@ -84,7 +89,8 @@ TEST_F(Ini, RefusesWhatCouldNotBeReadBack) {
     Put("[s]\nk=1\n");
     const struct { const char* section; const char* key; const char* value; } cases[] = {
         {"s", "", "v"}, {"s", nullptr, "v"}, {"s", "a=b", "v"}, {"s", "[a", "v"}, {"s", ";a", "v"}, {"s", " a", "v"},
-        {"s", "a", "v\nb=1"}, {"s", "a\nb", "v"}, {"s]", "a", "v"}, {"s", "#", nullptr}};
+        {"s", "a", "v\nb=1"}, {"s", "a\nb", "v"}, {"s]", "a", "v"}, {"s", "#", nullptr}, {"s", "a ", "v"},
+        {" s", "a", "v"}, {"s\n", "a", "v"}};
     for (const auto& c : cases) EXPECT_FALSE(Write(c.section, c.key, c.value)) << (c.key ? c.key : "null");
     EXPECT_EQ(Content(), "[s]\nk=1\n");
 }
@@ -114,8 +120,12 @@ TEST_F(Ini, AFileThatCannotBeReadIsNotReplaced) {
     std::filesystem::create_directory(File() += ".new");
     EXPECT_FALSE(Write("s", "k", "v"));
     std::filesystem::remove(File() += ".new");
+    std::filesystem::create_symlink("kelpcli.ini", File());
+    EXPECT_FALSE(Write("s", "k", "v"));
+    EXPECT_TRUE(std::filesystem::is_symlink(File()));
     setenv("KELPCI_HOME", (home_ / "nowhere").c_str(), 1);
     EXPECT_FALSE(Write("s", "k", "v"));
+    EXPECT_TRUE(IniWriteString((home_ / "own.ini").c_str(), "s", "k", "v"));
 }
 
 TEST_F(Ini, AWriteThatFindsNoRoomLeavesTheOldFile) {
