@@ -34,7 +34,7 @@ std::string Hash(const std::string& password, const char* setting) {
     const auto work = std::make_unique<crypt_data>();    // some 32 KB
     // Not crypt_r: the address sanitizer's own of that name needs the program itself to be linked with the real one.
     const char* hash = crypt_rn(password.c_str(), setting, work.get(), sizeof *work);
-    return hash && *hash != '*' ? hash : "";
+    return hash ? hash : "";
 }
 
 std::string NewHash(const std::string& password) {
@@ -142,7 +142,7 @@ Status ChangePassword(SqliteConnection& connection, const std::string& user, con
     if (!Matches(old_password, hash)) return Error(errors::kBadOldPassword);
     const std::string new_hash = Usable(new_password) ? NewHash(new_password) : std::string();
     if (new_hash.empty()) return Error(errors::kBadLogon);
-    (void)connection.ReadAhead(nullptr);
+    (void)connection.ReadAhead();
     return Run(connection, "update main.kelp_accounts set password = ?2 where name = ?1", {Folded(user), new_hash},
                nullptr, nullptr);
 }

@@ -106,10 +106,7 @@ private:
     }
 
     void Insert(std::size_t verb) {
-        std::size_t at = verb + 1;
-        while (at < pieces_.size() && at < verb + 4 && !Is(at, "into")) ++at;
-        if (!Is(at, "into")) return;
-        at = ReadTableName(pieces_, at + 1, table_);
+        std::size_t at = ReadTableName(pieces_, FindWord(verb, {"into"}) + 1, table_);
         if (Is(at, "as")) at += 2;
         Columns targets;
         if (Is(at, "(")) {
@@ -126,11 +123,9 @@ private:
 
     // The columns named in the list that opens at `open`; answers where the text goes on behind it.
     std::size_t ReadNames(std::size_t open, Columns& columns) {
-        std::size_t at = open + 1;
-        for (; at < pieces_.size() && !Is(at, ")"); ++at) {
-            if (!Is(at, ",")) columns.push_back(FindColumn(pieces_[at]));
-        }
-        return at + 1;
+        const std::size_t close = FindWord(open + 1, {});
+        for (std::size_t at = open + 1; at < close; at += 2) columns.push_back(FindColumn(pieces_[at]));
+        return close + 1;
     }
 
     TableColumn& Keep(TableColumn column) { return columns_.emplace_back(std::move(column)); }
@@ -156,10 +151,9 @@ private:
         std::size_t column = 0;
         for (std::size_t at = open;; ++column) {
             const std::size_t end = FindWord(at + 1, {","});
-            if (end >= pieces_.size()) return end;
             if (column < targets.size()) Assign({at + 1, end}, targets[column]);
             at = end;
-            if (Is(end, ")")) return end + 1;
+            if (!Is(end, ",")) return end + 1;
         }
     }
 
@@ -175,7 +169,7 @@ private:
     void WrapQuery(Span query, const Columns& targets, bool with_condition) {
         const bool concerned = std::any_of(targets.begin(), targets.end(),
                                            [](const TableColumn* target) { return target && target->concerned; });
-        if (!concerned || query.Size() == 0) return;
+        if (!concerned) return;
         std::string names;
         std::string values;
         for (std::size_t index = 0; index < targets.size(); ++index) {
@@ -207,17 +201,17 @@ private:
         while (Is(at, "set") || Is(at, ",")) {
             const std::size_t end =
                 FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", "on", ";"});
-            if (Is(at + 1, "(")) SetRow(at + 1);
-            else if (Is(at + 2, "=") && at + 3 < end) Assign({at + 3, end}, FindColumn(pieces_[at + 1]));
+            if (Is(at + 1, "(")) SetRow({at + 1, end});
+            else Assign({at + 3, end}, FindColumn(pieces_[at + 1]));
             at = end;
         }
     }
 
-    // (a, b) = (1, 2) or (a, b) = (select ...)
-    void SetRow(std::size_t open) {
+    // (a, b) = (1, 2) or (a, b) = (select ...); (a) = 1
+    void SetRow(Span row) {
         Columns targets;
-        const std::size_t equals = ReadNames(open, targets);
-        if (!Is(equals, "=") || !Is(equals + 1, "(")) return;
+        const std::size_t equals = ReadNames(row.first, targets);
+        if (targets.size() == 1) return Assign({equals + 1, row.last}, targets[0]);
         const std::size_t first = equals + 2;
         if (Is(first, "select") || Is(first, "with")) WrapQuery({first, FindWord(first, {})}, targets, false);
         else AssignList(equals + 1, targets);
@@ -230,7 +224,7 @@ private:
             targets_.parameters.push_back({index, target->column, Coercion::Purpose::store});
             return;
         }
-        if (!target || !target->concerned || span.Size() == 0 || IsHarmless(span, *target)) return;
+        if (!target || !target->concerned || IsHarmless(span, *target)) return;
         const std::string quote = IsLongNumber(span) ? "'" : "";
         targets_.edits.push_back(
             {Begin(span.first), End(span.last - 1), "kelp_store(" + quote, quote + Described(*target)});

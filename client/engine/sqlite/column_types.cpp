@@ -108,10 +108,9 @@ std::string Normal(std::string_view words) {
             if (!glue) normal.push_back(' ');
             continue;
         }
-        if ((c == '(' || c == ')' || c == ',') && !normal.empty() && normal.back() == ' ') normal.pop_back();
+        if ((c == '(' || c == ')' || c == ',') && normal.ends_with(' ')) normal.pop_back();
         normal.push_back(static_cast<char>(std::tolower(byte)));
     }
-    while (!normal.empty() && normal.back() == ' ') normal.pop_back();
     return normal;
 }
 
@@ -179,7 +178,6 @@ bool ReadDeclaredType(std::string_view declared, Column& column) {
     column.precision = row->precision;
     column.scale = row->scale;
     column.national = row->national;
-    column.characters = 0;
     Apply(row->measure == Measure::size && counts_characters ? Measure::characters : row->measure, normal, column);
     return true;
 }

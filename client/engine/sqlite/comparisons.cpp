@@ -39,7 +39,7 @@ public:
             if (piece == "(") {
                 levels.emplace_back();
             } else if (piece == ")") {
-                if (levels.size() > 1) levels.pop_back();
+                levels.pop_back();
             } else if (IsComparison(piece)) {
                 if (level.sets && IsAssignment(at)) continue;
                 if (level.compares) return Error(errors::kNotProperlyEnded, "a comparison of a comparison");
@@ -97,8 +97,8 @@ private:
     void Between(std::size_t at) {
         const Span subject = Subject(at);
         const Span first = operands_.From(at + 1);
-        if (first.Size() == 0 || !IsWord(At(first.last), "and")) return;
-        CompareEach(subject, {first, operands_.From(first.last + 1)});
+        const std::size_t middle = operands_.BehindCollations(first.last);
+        if (IsWord(At(middle), "and")) CompareEach(subject, {first, operands_.From(middle + 1)});
     }
 
     void In(std::size_t at) { CompareEach(Subject(at), operands_.List({at + 1, operands_.Partner(at + 1) + 1})); }

@@ -269,7 +269,7 @@ Status SqliteConnection::Begin(TransactionMode mode) {
     for (const Own own : {Own::commit, Own::rollback}) {
         if (Status status = CompileOwn(own); status.Failed()) return status;
     }
-    (void)ReadAhead(nullptr);
+    (void)ReadAhead();
     read_only_ = mode == TransactionMode::read_only;
     changes_before_ = sqlite3_total_changes64(Database());
     lobs_.TransactionBegins();
@@ -296,7 +296,7 @@ Status SqliteConnection::Commit() {
         return undone.Failed() ? undone : RolledBack(settled);
     }
     Status status = Run(Own::commit);
-    if (status.Number() != errors::kParentMissing && status.Number() != errors::kChildFound) return status;
+    if (status.Number() != errors::kParentMissing) return status;
     Status undone = Rollback();
     return undone.Failed() ? undone : Error(errors::kRolledBack, status.Detail()).From("SQLITE");
 }
@@ -304,7 +304,7 @@ Status SqliteConnection::Commit() {
 Status SqliteConnection::Rollback() {
     if (!InTransaction()) return {};
     const Unheeding undisturbed(*this);
-    (void)ReadAhead(nullptr);
+    (void)ReadAhead();
     lobs_.Forget();
     return InTransaction() ? Run(Own::rollback) : Status();
 }
@@ -321,7 +321,7 @@ Status SqliteConnection::SetMark() {
 Status SqliteConnection::UndoToMark() {
     const Unheeding undisturbed(*this);
     const bool in_transaction = InTransaction();
-    const Status read = ReadAhead(nullptr);
+    const Status read = ReadAhead();
     if (in_transaction && !InTransaction()) return RolledBack(read);
     lobs_.Forget();
     Status status = Run(Own::undo);
@@ -342,7 +342,7 @@ Status SqliteConnection::Recover(std::vector<Xid>&) { return Unsupported("two-ph
 
 // Only a foreign key is checked at the end.
 Status SqliteConnection::MakeReady(bool& changed) {
-    changed = InTransaction() && sqlite3_total_changes64(Database()) != changes_before_;
+    changed = sqlite3_total_changes64(Database()) != changes_before_;
     int unresolved = 0, highest = 0;
     sqlite3_db_status(Database(), SQLITE_DBSTATUS_DEFERRED_FKS, &unresolved, &highest, 0);
     if (unresolved == 0) return {};
@@ -351,7 +351,7 @@ Status SqliteConnection::MakeReady(bool& changed) {
 }
 
 // Outside a transaction an older query's rows would keep a new one from seeing what others have committed since.
-Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, bool& began) {
+Status SqliteConnection::Enter(const Entry& entry, bool& began) {
     began = false;
     broken_ = broken_ || !home_->Unchanged(handle_);
     if (broken_) return Error(errors::kEndOfChannel, "the read-only file has changed").From("SQLITE");
@@ -362,8 +362,7 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
     }
     const bool writes = entry.effect == Effect::changes || entry.effect == Effect::locks;
     if (InTransaction()) {
-        const bool reads = !writes && (entry.effect != Effect::controls || entry.read_only);
-        if (read_only_ && !reads) return Error(errors::kReadOnlyTransaction).From("SQLITE");
+        if (read_only_ && writes) return Error(errors::kReadOnlyTransaction).From("SQLITE");
     } else if (writes || entry.begins) {
         Status status = Begin(TransactionMode::read_write);
         began = status.Ok();
@@ -372,7 +371,7 @@ Status SqliteConnection::Enter(const Entry& entry, const SqliteQuery* query, boo
     const bool in_transaction = InTransaction();
     const bool goes_stale = !in_transaction && !Private();
     Status read;
-    if (!entry.read_only || entry.effect == Effect::controls || goes_stale) read = ReadAhead(query);
+    if (!entry.read_only || entry.effect == Effect::controls || goes_stale) read = ReadAhead();
     return in_transaction && !InTransaction() ? RolledBack(read) : Status();
 }
 
@@ -399,20 +398,18 @@ void SqliteConnection::Join(SqliteQuery& query) noexcept {
 
 void SqliteConnection::Leave(SqliteQuery& query) noexcept {
     if (query.previous_) query.previous_->next_open_ = query.next_open_;
-    else if (first_open_ == &query) first_open_ = query.next_open_;
+    else first_open_ = query.next_open_;
     if (query.next_open_) query.next_open_->previous_ = query.previous_;
     query.previous_ = query.next_open_ = nullptr;
     lobs_.LetGo();
 }
 
-Status SqliteConnection::ReadAhead(const SqliteQuery* except) noexcept {
+Status SqliteConnection::ReadAhead() noexcept {
     Status first;
     for (SqliteQuery* query = first_open_; query;) {
         SqliteQuery* next = query->next_open_;    // reading ahead takes the query off the list
-        if (query != except) {
-            const Status status = query->ReadAhead();
-            if (first.Ok()) first = status;
-        }
+        const Status status = query->ReadAhead();
+        if (first.Ok()) first = status;
         query = next;
     }
     return first;
@@ -452,7 +449,7 @@ int SqliteConnection::OnAccess(void* self, int action, const char* first, const 
                                const char*) {
     static_cast<SqliteConnection*>(self)->NoteTable(action, first);
     if (static_cast<SqliteConnection*>(self)->trusted_) return SQLITE_OK;
-    const auto is = [](const char* name, const char* wanted) { return name && sqlite3_stricmp(name, wanted) == 0; };
+    const auto is = [](const char* name, const char* wanted) { return sqlite3_stricmp(name, wanted) == 0; };
     if (action == SQLITE_READ) return is(first, kAccounts) && is(second, kPasswords) ? SQLITE_DENY : SQLITE_OK;
     for (const GuardedRow& row : kGuarded) {
         if (row.action == action) return is(row.table_is_second ? second : first, kAccounts) ? SQLITE_DENY : SQLITE_OK;

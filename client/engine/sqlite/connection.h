@@ -104,14 +104,14 @@ public:
         bool goes_back = false;    // to a savepoint: rows are again what they were
     };
     // Makes way for a statement: ends or begins a transaction, and has the open queries but `query` read ahead.
-    Status Enter(const Entry& entry, const SqliteQuery* query, bool& began);
+    Status Enter(const Entry& entry, bool& began);
     // Ends a transaction that Enter began for a statement that then did nothing.
     void Abandon() noexcept;
     void Join(SqliteQuery& query) noexcept;     // the query has rows to come
     void Leave(SqliteQuery& query) noexcept;
     // Lets the open queries but `except` read the rest of their rows, so that none holds an old state of the database.
     // The first failure, of which the fetch that gets there is told: of interest if it has lost the transaction.
-    Status ReadAhead(const SqliteQuery* except) noexcept;
+    Status ReadAhead() noexcept;
     [[nodiscard]] bool HasOpenQueries() const { return first_open_ != nullptr; }
     [[nodiscard]] LobStore& LobsOfTables() { return lobs_; }
     // How many changes of rows the connection was told of.

@@ -88,8 +88,7 @@ void TextToNumber(sqlite3_context* context, int count, Arguments arguments) {
 }
 
 // hextoraw(digits); before an odd number of them stands a 0.
-void HexToRaw(sqlite3_context* context, int count, Arguments arguments) {
-    if (AnyNull(count, arguments)) return sqlite3_result_null(context);
+void HexToRaw(sqlite3_context* context, int, Arguments arguments) {
     const TextArgument digits(arguments[0]);
     if (digits.Failure() != 0) return Refuse(context, digits.Failure());
     ResultText bytes(digits.Text().size() / 2 + 1);

@@ -41,7 +41,7 @@ public:
 
 private:
     [[nodiscard]] std::string_view At(std::size_t index) const { return operands_.At(index); }
-    [[nodiscard]] std::string_view Before(std::size_t index) const { return index > 0 ? At(index - 1) : std::string_view(); }
+    [[nodiscard]] std::string_view Before(std::size_t index) const { return At(index - 1); }
 
     // What stands before an operator. What is in a list or exists is a number.
     [[nodiscard]] Span Left(std::size_t at) const {
@@ -53,7 +53,7 @@ private:
     // Of the call whose name stands at `function`.
     [[nodiscard]] std::vector<Span> Arguments(std::size_t function) const {
         std::vector<Span> arguments = operands_.List({function + 1, operands_.Partner(function + 1) + 1});
-        if (!arguments.empty() && IsOneOf(At(arguments[0].first), {"distinct", "all"})) ++arguments[0].first;
+        if (IsOneOf(At(arguments[0].first), {"distinct", "all"})) ++arguments[0].first;
         return arguments;
     }
 

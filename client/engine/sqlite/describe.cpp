@@ -23,7 +23,6 @@ constexpr std::uint32_t kRowIdSize = 18;
 void MakeNumber(Column& column) {
     column.type = SQLT_NUM;
     column.size = kNumberSize;
-    column.precision = 0;
     column.scale = kFloating;
 }
 
@@ -137,7 +136,7 @@ std::string ShownName(std::string_view name, std::string_view sql) {
 bool IsNullable(sqlite3* database, sqlite3_stmt* statement, int index) {
     const char* table = sqlite3_column_table_name(statement, index);
     const char* origin = sqlite3_column_origin_name(statement, index);
-    if (!table || !origin) return true;
+    if (!table) return true;
     int not_null = 0;
     int primary_key = 0;
     sqlite3_table_column_metadata(database, sqlite3_column_database_name(statement, index), table, origin, nullptr,

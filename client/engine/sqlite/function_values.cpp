@@ -88,7 +88,6 @@ void ReturnDatum(sqlite3_context* context, const Datum& datum) {
         case Kind::integer: return sqlite3_result_int64(context, datum.integer);
         case Kind::real: return sqlite3_result_double(context, datum.real);
         case Kind::decimal: return ReturnNumber(context, *static_cast<const OCINumber*>(datum.data));
-        case Kind::timestamp: return ReturnDate(context, datum.Timestamp());
         case Kind::text:
             return sqlite3_result_text64(context, datum.length ? datum.Text().data() : "", datum.length,
                                          SQLITE_TRANSIENT, SQLITE_UTF8);

@@ -23,6 +23,11 @@ bool Ends(std::string_view piece) {
     return IsName(piece) && !IsOneOf(piece, {"collate", "like", "glob", "match", "regexp", "escape", "over", "filter", "range"});
 }
 
+// What makes a condition of the expression before it.
+bool IsCondition(std::string_view piece) {
+    return IsComparison(piece) || IsOneOf(piece, {"is", "isnull", "notnull", "not", "in", "between"});
+}
+
 // Functions whose first argument may be an interval's text.
 bool TakesText(std::string_view function) {
     constexpr std::string_view kPrefixes[] = {"kelp_varchar", "kelp_nvarchar", "kelp_char", "kelp_nchar", kSpanPrefix};
@@ -53,9 +58,7 @@ public:
 
 private:
     [[nodiscard]] std::string_view At(std::size_t index) const { return operands_.At(index); }
-    [[nodiscard]] std::string_view Before(std::size_t index) const {
-        return index > 0 ? At(index - 1) : std::string_view();
-    }
+    [[nodiscard]] std::string_view Before(std::size_t index) const { return At(index - 1); }
     void Refuse() {
         const bool is_named = type_ && !type_->column.name.empty();    // no cast
         status_ = Error(errors::kInconsistentTypes, is_named ? "column " + type_->column.name : "an interval");
@@ -82,7 +85,6 @@ private:
         while (at-- > 0) {
             if (At(at) == ")") at = operands_.Partner(at);
             else if (At(at) == "(" || IsOneOf(At(at), {"select", "by", "set", "returning", "values", "from", "limit"})) return at;
-            if (at >= pieces_.size()) break;
         }
         return kNone;
     }
@@ -111,8 +113,9 @@ private:
                     return IsWord(function, "count") || InList(span, open);
                 }
                 is_plain = false;
-            } else if (after != "||" && (IsOneOf(before, {"select", "all", "distinct", "returning"}) ||
-                                         (before == "," && IsOneOf(At(Clause(span.first)), {"select", "returning"})))) {
+            } else if (after != "||" && !IsCondition(after) &&
+                       (IsOneOf(before, {"select", "all", "distinct", "returning"}) ||
+                        (before == "," && IsOneOf(At(Clause(span.first)), {"select", "returning"})))) {
                 if (!Ends(after)) return false;
                 const std::size_t clause = Clause(span.first);
                 if (At(clause) == "(") return IsWord(Before(clause), "count");
@@ -136,17 +139,15 @@ private:
         if (IsComparison(before)) return Ends(after) && BehindComparison(span);
         const std::size_t low = IsWord(before, "and") ? operands_.Before(span.first - 1).first : span.first;
         if (IsWord(Before(low), "between")) return Ends(after) && Fits(Subject(low - 1), span) && BoundsFit(low, span);
-        if (!Begins(before) || IsOneOf(before, {"case", "when", "then", "else", "like", "glob", "limit", "offset"})) return false;
+        if (!Begins(before) || IsOneOf(before, {"is", "like", "glob", "escape"})) return false;
         if (IsWord(before, "in")) return Ends(after) && Fits(Subject(span.first - 1), span);
-        if (IsWord(before, "exists")) return true;
         if (IsComparison(after)) return IsTarget(span) || Fits(operands_.From(span.last + 1), span);
         if (IsOneOf(after, {"isnull", "notnull"})) return true;
         if (IsOneOf(after, {"is", "not", "in", "between"})) return BeforeCondition(span);
         if (!Ends(after)) return false;
         if (IsWord(before, "by")) return true;
         const std::size_t clause = before == "(" ? span.first - 1 : before == "," ? Clause(span.first) : kNone;
-        return IsWord(At(clause), "by") || (At(clause) == "(" && InList(span, clause)) ||
-               (IsWord(At(clause), "values") && AsText(span));
+        return IsWord(At(clause), "by") || (At(clause) == "(" && InList(span, clause));
     }
 
     [[nodiscard]] Span Subject(std::size_t at) const { return operands_.Before(IsWord(Before(at), "not") ? at - 1 : at); }
@@ -196,8 +197,7 @@ private:
         if (operands_.IsValue(bare)) return IsOfType(span);
         if (!operands_.IsQuery(bare)) return IsOfType(other);
         if (!IsWord(At(bare.first), "select") || IsCompound(bare.first)) return false;
-        const std::vector<Names::Item> items = names_.Items(bare.first);
-        return items.size() == 1 && !items[0].is_all && IsOfType(items[0].expression);
+        return IsOfType(names_.Items(bare.first)[0].expression);
     }
 
     bool IsOfType(Span span) {
@@ -217,8 +217,10 @@ private:
         if (is_first && TakesText(word)) return AsText(span);
         std::size_t name = open - 1;
         while (Before(name) == ".") name -= 2;
-        const std::size_t close = operands_.Partner(open);
-        const bool names_with = IsWord(At(close + 1), "as") && !IsOneOf(At(0), {"create"});
+        const std::size_t as = operands_.Partner(open) + 1;
+        std::size_t query = as + 1;
+        while (IsOneOf(At(query), {"not", "materialized"})) ++query;
+        const bool names_with = IsWord(At(as), "as") && At(query) == "(";
         return IsWord(Before(name), "into") || names_with;
     }
 
@@ -299,7 +301,7 @@ private:
             if (!IsWord(At(part), "select")) return false;
             const std::vector<Names::Item> items = names_.Items(part);
             const bool is_all = std::any_of(items.begin(), items.end(), [](const Names::Item& item) { return item.is_all; });
-            return !is_all && index < items.size() && IsOfType(items[index].expression);
+            return !is_all && IsOfType(items[index].expression);
         });
     }
 

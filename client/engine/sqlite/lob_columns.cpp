@@ -63,11 +63,6 @@ public:
 
 private:
     std::string Name() const { return read_.alias.empty() ? QuotedName(read_.table.name) : std::string(read_.alias); }
-    [[nodiscard]] bool IsTable(std::string_view piece) const {
-        const std::string name = PlainName(piece);
-        const std::string wanted = read_.alias.empty() ? read_.table.name : PlainName(read_.alias);
-        return sqlite3_stricmp(name.c_str(), wanted.c_str()) == 0;
-    }
 
     void RewriteItem(Span item) {
         const bool qualified = item.Size() >= 3 && pieces_[item.first + 1] == ".";
@@ -77,7 +72,7 @@ private:
         const bool behind = name + 1 < item.last;    // an alias, or more of an expression
         const bool alias = behind && (name + 2 == item.last ? IsName(pieces_[name + 1]) && !IsAnyOf(pieces_[name + 1], {"is", "isnull", "notnull"})
                                                             : IsWord(pieces_[name + 1], "as"));
-        if ((behind && !alias) || !IsName(pieces_[name]) || (qualified && !IsTable(pieces_[item.first]))) return;
+        if ((behind && !alias) || !IsName(pieces_[name])) return;
         TableColumn column;
         if (!ReadColumn(database_, read_.table, pieces_[name], column) || !ObjectKindOf(column.column)) return;
         Note(index, column);

@@ -216,7 +216,7 @@ Status ColumnLob::Write(std::uint64_t offset, std::span<const std::byte> in) {
     LobStore::Draft* draft = Store().FindDraft(*column_, row_);
     if (!draft) {
         SqliteConnection& connection = Store().connection_;
-        if (Status status = connection.ReadAhead(nullptr); !connection.InTransaction()) return status;
+        if (Status status = connection.ReadAhead(); !connection.InTransaction()) return status;
         const Status opened = Open(true);    // not where the column is part of an index
         if (opened.Ok() && offset + in.size() <= Store().open_.Length()) {
             const bool in_transaction = connection.InTransaction();
@@ -387,7 +387,7 @@ LobStore::Draft* LobStore::FindDraft(const LobColumn& column, std::int64_t row) 
 Status LobStore::MakeDraft(const std::shared_ptr<const LobColumn>& column, std::int64_t row, Draft*& draft) {
     auto made = std::make_unique<Draft>(column, row, file_);
     drafts_.reserve(drafts_.size() + 1);
-    if (Status status = connection_.ReadAhead(nullptr); !connection_.InTransaction()) return status;
+    if (Status status = connection_.ReadAhead(); !connection_.InTransaction()) return status;
     Status status = open_.Open(connection_, column, row, false);
     if (status.Ok()) status = CopyValue(connection_, open_, made->bytes);
     if (status.Failed()) return status;

@@ -197,7 +197,7 @@ Names::Item Names::ReadItem(Span span) const {
     } else if (span.Size() > 2 && IsWord(At(span.last - 2), "as")) {
         item.name = last;
         item.expression.last -= 2;
-    } else if (operands_.From(span.first).last + 1 == span.last) {
+    } else if (operands_.From(span.first).last + 1 == span.last && !IsOneOf(last, {"isnull", "notnull"})) {
         item.name = last;
         --item.expression.last;
     } else if (operands_.IsColumn(span)) {

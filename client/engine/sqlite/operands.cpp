@@ -133,7 +133,13 @@ std::size_t Operands::OperandBegin(std::size_t last) const {
     return at;
 }
 
+std::size_t Operands::BehindCollations(std::size_t at) const {
+    while (IsWord(At(at), "collate")) at += 2;
+    return at;
+}
+
 Span Operands::Before(std::size_t last) const {
+    while (IsWord(At(last - 2), "collate")) last -= 2;
     std::size_t begin = OperandBegin(last);
     while (begin < last && begin > 0 && Contains(kArithmetic, At(begin - 1))) begin = OperandBegin(begin - 1);    // or a sign
     return {begin, last};

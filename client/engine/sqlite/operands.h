@@ -22,7 +22,8 @@ public:
     // The expression that begins at `first`, or ends before `last`, as far as arithmetic and || go; empty when none is
     // understood.
     [[nodiscard]] Span From(std::size_t first) const;
-    [[nodiscard]] Span Before(std::size_t last) const;
+    [[nodiscard]] Span Before(std::size_t last) const;    // without its collations
+    [[nodiscard]] std::size_t BehindCollations(std::size_t at) const;
     // One operand alone, with its signs.
     [[nodiscard]] Span OneFrom(std::size_t first) const { return {first, OperandEnd(first)}; }
     [[nodiscard]] Span OneBefore(std::size_t last) const;

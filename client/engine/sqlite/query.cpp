@@ -327,7 +327,7 @@ Status SqliteQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOu
     std::vector<ArrayOutcome::Failure>& failures = outcome.failures;
     failures.reserve(failures.size() + 2);
     Running running(connection_, statement_);
-    Status status = connection_.Enter(entry_, this, running.began);
+    Status status = connection_.Enter(entry_, running.began);
     if (status.Ok()) status = FollowSchema();
     if (status.Failed()) return status;
     const bool in_transaction = connection_.InTransaction();

@@ -39,7 +39,7 @@ Status SqliteQuery::Open(RowSource& source, const QueryRun& run) {
     Close();
     if (connection_.Stopping()) return SqliteConnection::Stopped();
     Running running(connection_, statement_);
-    Status status = connection_.Enter(entry_, this, running.began);
+    Status status = connection_.Enter(entry_, running.began);
     if (status.Ok()) status = FollowSchema();
     bool has_row = false;
     if (status.Ok()) status = Start(source, run.row, has_row);
