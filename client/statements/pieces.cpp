@@ -28,6 +28,7 @@ private:
 Status Statement::StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments) {
     if (Status status = pieces_.StartExecute(text_, arguments); !status.Ok()) return status;
     ForgetOutcome();
+    told_ = {};
     return ContinueExecute(error);
 }
 
@@ -62,6 +63,7 @@ Status Statement::ContinueExecute(ErrorHandle& error) {
     pieces_.End();
     if (status.Failed()) return status;
     if (!Scanned().is_block) status = Finish(error, arguments);
+    if (status.Ok()) status = std::exchange(told_, {});
     if (status.Ok() && pieces_.Warned()) status = Warning(errors::kTruncationWarning);
     return Complete(std::move(status), arguments);
 }
@@ -75,6 +77,7 @@ Status Statement::RunCollected(bool& stopped) {
     Status status = is_block ? RunBlock({row + 1, row, mode}) : RunRows({row + 1, row, mode});
     if (!is_block) run_.row_count = outcome_.affected;
     if (!is_block && outcome_.executed == done_before) pieces_.ForgetReturned();
+    if (is_block && !status.Ok() && !status.Failed()) told_ = std::exchange(status, {});
     stopped = status.Failed() || (!outcome_.failures.empty() && !(mode & OCI_BATCH_ERRORS));
     if (!stopped) pieces_.StartDelivery(is_block);
     return status;

@@ -186,6 +186,7 @@ private:
     Execution run_;
     PieceStream pieces_{this};
     engine::ArrayOutcome outcome_;    // of the execute; of one in pieces, what its iterations did so far
+    Status told_;    // by a block in pieces so far: a warning that stops nothing
     CallbackDriver driver_;
     Parameters parameters_;    // by position - 1
 };
