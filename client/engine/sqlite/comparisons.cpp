@@ -160,8 +160,9 @@ private:
     // placeholders and literals.
     void Use(Span span, const TableColumn& column) {
         const Span bare = operands_.Bare(span);
-        if (bare.Size() == 0) return;
-        if (operands_.IsValue(bare)) {
+        if (bare.Size() == 0) {
+            if (IsDateType(column.column.type)) status_ = Error(errors::kInconsistentTypes, "column " + column.column.name);
+        } else if (operands_.IsValue(bare)) {
             const std::size_t parameter = ParameterOf(At(bare.first));
             if (parameter == kNoParameter) return UseLiteral(bare, column);
             targets_.parameters.push_back({parameter, column.column, Coercion::Purpose::compare});

@@ -24,12 +24,6 @@ bool IsSameName(std::string_view left, std::string_view right) {
            sqlite3_strnicmp(left.data(), right.data(), static_cast<int>(left.size())) == 0;
 }
 
-std::string Quoted(std::string_view name) {
-    std::string quoted = "\"";
-    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
-    return quoted += '"';
-}
-
 Status NoValue() { return Error(errors::kNoLobValue).From("SQLITE"); }
 
 // All of an open value.
@@ -50,7 +44,7 @@ Status OpenValue::Open(SqliteConnection& connection, const std::shared_ptr<const
     const bool in_transaction = connection.InTransaction();
     int code = SQLITE_ABORT;
     if (blob_ && column_ == column && (writes_ || !writes)) {
-        if (positioned_ && row_ == row && sqlite3_blob_read(blob_, nullptr, 0, 0) == SQLITE_OK) return {};
+        if (row_ == row && sqlite3_blob_read(blob_, nullptr, 0, 0) == SQLITE_OK) return {};
         code = sqlite3_blob_reopen(blob_, row);
     }
     if (code != SQLITE_OK) {
@@ -62,8 +56,7 @@ Status OpenValue::Open(SqliteConnection& connection, const std::shared_ptr<const
         writes_ = writes;
     }
     row_ = row;
-    positioned_ = code == SQLITE_OK;
-    if (positioned_) return {};
+    if (code == SQLITE_OK) return {};
     Status status = (code & 0xFF) == SQLITE_ERROR ? NoValue() : connection.Failed(code, Verb::other, in_transaction);
     Close();
     return status;
@@ -72,7 +65,6 @@ Status OpenValue::Open(SqliteConnection& connection, const std::shared_ptr<const
 void OpenValue::Close() noexcept {
     sqlite3_blob_close(blob_);
     blob_ = nullptr;
-    positioned_ = false;
 }
 
 // One that failed may take the transaction with it when it is closed: that is done at once, where it is noticed.
@@ -100,7 +92,7 @@ public:
     [[nodiscard]] bool IsTemporary() const override { return false; }
     [[nodiscard]] bool IsSame(const Lob& other) const override {
         const auto* column = dynamic_cast<const ColumnLob*>(&other);
-        return column && column->shared_ == shared_ && column->column_ == column_ && column->row_ == row_;
+        return column && column->column_ == column_ && column->row_ == row_;
     }
     [[nodiscard]] std::uint64_t Version() const override;
     Status Length(std::uint64_t& bytes) override;
@@ -132,25 +124,16 @@ private:
 // The last time that the value may have changed.
 std::uint64_t ColumnLob::Version() const {
     if (copy_ || !shared_->store) return 0;
-    std::uint64_t changed_at = 0;
-    if (const LobStore::Table* const table = Store().FindTable(*column_)) {
-        const auto found = table->changes.find(row_);
-        if (found != table->changes.end()) changed_at = found->second.at;
-    }
-    return std::max({changed_at, Store().floor_, Store().undone_at_});
+    return std::max({Store().ChangeOf(*column_, row_).at, Store().floor_, Store().undone_at_});
 }
 
 // Whether the row is there and, unless the present value counts, what it was.
 Status ColumnLob::Check() {
     if (!shared_->store) return Error(errors::kInvalidLocator);
     if (seen_at_ < Store().floor_) return Error(errors::kSnapshotTooOld).From("SQLITE");
-    if (const LobStore::Table* table = Store().FindTable(*column_)) {
-        const auto found = table->changes.find(row_);
-        const LobStore::Change change = found == table->changes.end() ? LobStore::Change() : found->second;
-        if (change.replaced_at > seen_at_) return NoValue();
-        const bool undone = Store().undone_at_ > seen_at_ && change.transaction == transaction_ && change.at > 0;
-        if ((change.at > seen_at_ || undone) && !is_current_) return Error(errors::kSnapshotTooOld).From("SQLITE");
-    }
+    const LobStore::Change change = Store().ChangeOf(*column_, row_);
+    if (change.replaced_at > seen_at_) return NoValue();
+    if (change.at > seen_at_ && !is_current_) return Error(errors::kSnapshotTooOld).From("SQLITE");
     if (is_brief_ || Store().InTransaction(transaction_) || Store().connection_.Private()) return {};
     return CheckOthers();
 }
@@ -307,13 +290,16 @@ bool LobStore::InTransaction(std::uint64_t number) const {
     return number == transaction_ && connection_.InTransaction();
 }
 
+LobStore::Change LobStore::ChangeOf(const LobColumn& column, std::int64_t row) {
+    const Table& table = *FindTable(column);
+    const auto found = table.changes.find(row);
+    return found == table.changes.end() ? Change() : found->second;
+}
+
 // A row that the transaction has written is locked. Who came too late to see it written takes it for one that is.
 bool LobStore::IsWrittenRow(const LobColumn& column, std::int64_t row) {
-    const Table* table = FindTable(column);
-    if (!table) return false;
-    if (table->known_since == transaction_ && table->changed_before) return true;
-    const auto found = table->changes.find(row);
-    return found != table->changes.end() && found->second.transaction == transaction_;
+    const Table& table = *FindTable(column);
+    return (table.known_since == transaction_ && table.changed_before) || ChangeOf(column, row).transaction == transaction_;
 }
 
 // Asking begins to read; of a transaction it is the same all through.
@@ -341,7 +327,7 @@ void LobStore::LetGo() noexcept {
 
 void LobStore::Note(const LobColumn& column, std::int64_t row, bool replaced) noexcept {
     ++now_;
-    if (Table* const table = FindTable(column)) Note(*table, row, replaced);
+    Note(*FindTable(column), row, replaced);
 }
 
 void LobStore::Note(Table& table, std::int64_t row, bool replaced) noexcept {
@@ -433,8 +419,8 @@ Status LobStore::Settle() {
 Status LobStore::Flush(Draft& draft) {
     sqlite3* const database = connection_.Database();
     const LobColumn& column = *draft.column;
-    const std::string sql = "update " + Quoted(column.schema) + '.' + Quoted(column.table) + " set " +
-                            Quoted(column.name) + " = ?1 where rowid = ?2";
+    const std::string sql = "update " + QuotedName(column.schema) + '.' + QuotedName(column.table) + " set " +
+                            QuotedName(column.name) + " = ?1 where rowid = ?2";
     const SqliteConnection::Trusted trusted(connection_);
     sqlite3_db_config(database, SQLITE_DBCONFIG_ENABLE_TRIGGER, 0, nullptr);
     sqlite3_stmt* compiled = nullptr;

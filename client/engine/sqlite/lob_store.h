@@ -48,7 +48,6 @@ public:
     Status Open(SqliteConnection& connection, const std::shared_ptr<const LobColumn>& column, std::int64_t row,
                 bool writes);
     void Close() noexcept;
-    [[nodiscard]] bool IsOpen() const { return blob_ != nullptr; }
     [[nodiscard]] std::uint64_t Length() const { return static_cast<std::uint64_t>(sqlite3_blob_bytes(blob_)); }
     // Within the length.
     [[nodiscard]] int Read(std::uint64_t offset, std::span<std::byte> out);
@@ -61,7 +60,6 @@ private:
     std::shared_ptr<const LobColumn> column_;
     std::int64_t row_ = 0;
     bool writes_ = false;
-    bool positioned_ = false;
 };
 
 class LobStore final : public engine::LobStore {
@@ -121,7 +119,8 @@ private:
         LobStore* store;
     };
 
-    Table* FindTable(const LobColumn& column);
+    Table* FindTable(const LobColumn& column);    // null before there is any such column
+    Change ChangeOf(const LobColumn& column, std::int64_t row);    // nothing's where none is known
     void Note(const LobColumn& column, std::int64_t row, bool replaced) noexcept;
     void Note(Table& table, std::int64_t row, bool replaced) noexcept;
     Draft* FindDraft(const LobColumn& column, std::int64_t row);

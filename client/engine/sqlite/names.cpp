@@ -12,7 +12,9 @@ namespace engine::sqlite {
 namespace {
 
 // What is kept as something that it does not look like.
-bool IsMoment(const Column& column) { return IsDateType(column.type) || IsIntervalType(column.type); }
+bool IsMoment(const TableColumn* column) {
+    return column && (IsDateType(column->column.type) || IsIntervalType(column->column.type));
+}
 
 bool IsSame(const std::string& left, const std::string& right) { return sqlite3_stricmp(left.c_str(), right.c_str()) == 0; }
 
@@ -20,18 +22,16 @@ bool IsSame(const std::string& left, const std::string& right) { return sqlite3_
 
 const TableColumn* Names::TypeOf(Span span) {
     span = operands_.Bare(span);
-    if (span.Size() == 0 || operands_.IsValue(span)) return nullptr;
+    if (operands_.IsValue(span)) return nullptr;
     if (operands_.IsColumn(span)) return Resolve(span);
     for (const Span choice : operands_.Choices(span)) {
-        const TableColumn* const column = TypeOf(choice);
-        if (column && IsMoment(column->column)) return column;
+        if (const TableColumn* const column = TypeOf(choice); IsMoment(column)) return column;
     }
     const TableColumn* const column = IsName(At(span.first)) ? AnswerOf(span) : nullptr;
-    return column && IsMoment(column->column) ? column : nullptr;
+    return IsMoment(column) ? column : nullptr;
 }
 
 const TableColumn* Names::AnswerOf(Span span) {
-    if (span.Size() == 0) return nullptr;
     const ExpressionType type = ReadType({pieces_.begin() + static_cast<std::ptrdiff_t>(span.first),
                                           pieces_.begin() + static_cast<std::ptrdiff_t>(span.last)});
     if (!type.argument.empty()) {
@@ -57,19 +57,21 @@ const TableColumn* Names::Resolve(Span name) {
     return FindName(At(name.last - 1), qualifier, scopes_[name.first]).column;
 }
 
-// A column of the table that the qualifier says, or of those of the innermost query that has one so called; else of
-// any table, as behind what is not understood.
+// A column of the table that the qualifier says, or of those of the innermost query that has one so called; of any table
+// where the qualifier is of something else, as of a join in parentheses.
 Names::Found Names::FindName(std::string_view column, const std::string& qualifier, std::size_t scope) {
-    const auto is_meant = [&](const Table& table) {
-        return qualifier.empty() || IsSame(table.name, qualifier);
-    };
     for (;; scope = parents_[scope]) {
-        const auto in_scope = [&](const Table& table) { return table.scope == scope && is_meant(table); };
-        const Found found = Agreed(column, in_scope);
+        const Found found = FindInScope(column, qualifier, scope);
         if (found.any || !status_.Ok()) return found;
         if (parents_[scope] == scope) break;
     }
-    return {};
+    return qualifier.empty() ? Found() : Agreed(column, [](const Table&) { return true; });
+}
+
+Names::Found Names::FindInScope(std::string_view column, const std::string& qualifier, std::size_t scope) {
+    return Agreed(column, [&](const Table& table) {
+        return table.scope == scope && (qualifier.empty() || IsSame(table.name, qualifier));
+    });
 }
 
 // The column of that name in the tables meant, if they agree on its type. Dates and intervals are too easily taken
@@ -81,9 +83,10 @@ Names::Found Names::Agreed(std::string_view name, Meant is_meant) {
         if (!is_meant(tables_[index])) continue;
         const Found found = ColumnOf(tables_[index], name);
         if (!found.any) continue;
-        const bool differs = agreed.column && found.column && agreed.column->column.type != found.column->column.type;
-        const bool dates = differs && (IsMoment(agreed.column->column) || IsMoment(found.column->column));
-        if (dates) status_ = Error(errors::kInconsistentTypes, "column " + PlainName(name));
+        const auto type = [](const Found& of) -> int { return of.column ? of.column->column.type : 0; };
+        const bool differs = agreed.any && type(agreed) != type(found);
+        if (differs && (IsMoment(agreed.column) || IsMoment(found.column)))
+            status_ = Error(errors::kInconsistentTypes, "column " + PlainName(name));
         if (differs) return {true, nullptr};
         agreed = found;
     }
@@ -96,11 +99,17 @@ Names::Found Names::ColumnOf(const Table& table, std::string_view name) {
         if (!ReadColumn(database_, table.table, name, column)) return {};
         return {true, &columns_.emplace_back(std::move(column))};
     }
-    if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(table.query), "select")) return {};
+    if (IsTooDeep(name)) return {};
     ++depth_;
     const Found found = ColumnOfQuery(table, PlainName(name));
     --depth_;
     return found;
+}
+
+bool Names::IsTooDeep(std::string_view name) {
+    if (depth_ < kDeepest && ++looks_ <= kMostLooks) return false;
+    status_ = Error(errors::kInconsistentTypes, "column " + PlainName(name));
+    return true;
 }
 
 // By the select list of a subquery, or the names that WITH gives to its columns.
@@ -115,7 +124,7 @@ Names::Found Names::ColumnOfQuery(const Table& table, const std::string& name) {
     }
     for (const Item& item : Items(table.query)) {
         if (item.is_all) {
-            const Found found = FindName(name, item.qualifier, scopes_[table.query]);
+            const Found found = FindInScope(name, item.qualifier, scopes_[table.query]);
             if (found.any) return found;
         } else if (is_called(item.name)) {
             return {true, TypeOf(item.expression)};
@@ -140,7 +149,7 @@ bool Names::Expand(const Table& table, std::vector<Listed>& columns) {
 }
 
 bool Names::ExpandQuery(std::size_t query, std::vector<Listed>& columns) {
-    if (depth_ >= kDeepest || ++looks_ > kMostLooks || !IsWord(At(query), "select")) return false;
+    if (!IsWord(At(query), "select") || IsTooDeep("*")) return false;
     bool told = true;
     ++depth_;
     for (const Item& item : Items(query)) {
@@ -174,7 +183,7 @@ std::vector<Names::Item> Names::Items(std::size_t select) const {
     std::vector<Item> items;
     std::size_t begin = select + 1;
     if (IsOneOf(At(begin), {"distinct", "all"})) ++begin;
-    for (std::size_t at = begin; at <= pieces_.size(); ++at) {
+    for (std::size_t at = begin; ; ++at) {
         if (At(at) == "(") at = operands_.Partner(at) + 1;
         const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" ||
                           IsOneOf(At(at), {"from", "where", "group", "having", "window", "union", "except",
@@ -189,7 +198,6 @@ std::vector<Names::Item> Names::Items(std::size_t select) const {
 
 Names::Item Names::ReadItem(Span span) const {
     Item item{span, {}, false, {}};
-    if (span.Size() == 0) return item;
     const std::string_view last = At(span.last - 1);
     if (last == "*") {
         item.is_all = true;
@@ -207,11 +215,15 @@ Names::Item Names::ReadItem(Span span) const {
 }
 
 // The scope of each piece: a query, each part of a union for itself; what stands around the query of an insert is
-// none of its own. And the tables that are named behind from, join, into and update.
+// none of its own. And the tables that are named behind from, join, into and update, and commas behind from.
 void Names::ReadTables() {
     scopes_.assign(pieces_.size(), 0);
     parents_.assign(1, 0);
-    std::vector<std::size_t> open(1, 0);    // the scope at each depth of parentheses
+    struct Level {
+        std::size_t scope = 0;
+        bool lists = false;    // tables
+    };
+    std::vector<Level> open(1);    // at each depth of parentheses
     const auto enter = [&](std::size_t parent) {
         parents_.push_back(parent);
         return parents_.size() - 1;
@@ -222,22 +234,27 @@ void Names::ReadTables() {
         if (At(at) == "(") {
             const bool is_query = operands_.IsQuery({at + 1, pieces_.size()});
             if (is_query) NoteWith(at);
-            open.push_back(is_query ? enter(open.back()) : open.back());
-        } else if (At(at) == ")" && !outside) {
+            const bool lists = IsOneOf(At(at - 1), {"from", "join"}) || (open.back().lists && IsOneOf(At(at - 1), {",", "("}));
+            open.push_back(is_query ? Level{enter(open.back().scope)} : Level{open.back().scope, lists});
+        } else if (At(at) == ")") {
             open.pop_back();
         } else if (IsOneOf(At(at), {"union", "except", "intersect"})) {
-            const std::size_t parent = parents_[open.back()];
-            open.back() = enter(parent == open.back() ? parents_.size() : parent);
-        } else if (IsWord(At(at), "select") && inserts && outside && open.back() == 0) {
-            open.back() = enter(parents_.size());
-        } else if (IsOneOf(At(at), {"conflict", "returning"}) && outside) {
-            open.back() = 0;
+            const std::size_t scope = open.back().scope, parent = parents_[scope];
+            open.back() = {enter(parent == scope ? parents_.size() : parent)};
+        } else if (IsWord(At(at), "select") && inserts && outside && open.back().scope == 0) {
+            open.back().scope = enter(parents_.size());
+        } else if (inserts && outside && (IsWord(At(at), "returning") || (IsWord(At(at - 1), "on") && IsWord(At(at), "conflict")))) {
+            open.back().scope = 0;
             if (IsWord(At(at), "conflict")) NoteExcluded();
         }
-        scopes_[at] = open.back();
+        Level& level = open.back();
+        scopes_[at] = level.scope;
         if (IsWord(At(at), "into")) inserts = true;
-        if (IsOneOf(At(at), {"from", "join", "into", "update"}))
-            ReadList(IsWord(At(at + 1), "or") ? at + 3 : at + 1, open.back(), IsWord(At(at), "into"));
+        const bool from = IsWord(At(at), "from") && !IsWord(At(at - 1), "distinct");    // no comparison
+        if (from) level.lists = true;
+        if (IsOneOf(At(at), {"where", "group", "having", "window", "order", "limit", "returning"})) level.lists = false;
+        if (from || IsOneOf(At(at), {"join", "into", "update"}) || (At(at) == "," && level.lists))
+            ReadTable(IsWord(At(at + 1), "or") ? at + 3 : at + 1, level.scope, IsWord(At(at), "into"));
     }
     for (Table& table : tables_)
         if (table.query == 0) UseWith(table);    // which comes later
@@ -261,8 +278,8 @@ std::size_t Names::MainQuery(std::size_t at) const {
 // with NAME as (query), with NAME(a, b) as (query): the query opens at `open`.
 void Names::NoteWith(std::size_t open) {
     std::size_t at = open;
-    while (at > 0 && IsOneOf(At(at - 1), {"materialized", "not"})) --at;
-    if (at < 2 || !IsWord(At(at - 1), "as")) return;
+    while (IsOneOf(At(at - 1), {"materialized", "not"})) --at;
+    if (!IsWord(At(at - 1), "as")) return;
     With with;
     with.query = MainQuery(open + 1);
     at -= 2;
@@ -272,33 +289,32 @@ void Names::NoteWith(std::size_t open) {
         at = names - 1;
     }
     with.name = PlainName(At(at));
+    const std::size_t around = operands_.Around(at);
+    with.seen = {around, around < pieces_.size() ? operands_.Partner(around) : 0};
     withs_.push_back(std::move(with));
 }
 
-void Names::ReadList(std::size_t at, std::size_t scope, bool is_target) {
+void Names::ReadTable(std::size_t at, std::size_t scope, bool is_target) {
     while (At(at) == "(" && !operands_.IsQuery({at + 1, pieces_.size()})) ++at;
-    for (;;) {
-        const bool is_query = At(at) == "(";
-        if (!is_query && (!IsName(At(at)) || IsKeyword(At(at)))) return;
-        Table& table = tables_.emplace_back();
-        table.scope = scope;
-        table.is_natural = IsNaturalJoin(at);
-        table.is_target = is_target;
-        if (is_query) {
-            table.query = MainQuery(at + 1);
-            at = operands_.Partner(at) + 1;
-        } else {
-            at = ReadTableName(pieces_, at, table.table);
-            table.name = table.table.name;
-            UseWith(table);
-        }
-        if (IsWord(At(at), "as")) ++at;
-        if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
-        if (IsWord(At(at), "using"))
-            for (std::size_t name = at + 2; name < operands_.Partner(at + 1); name += 2) table.merged.push_back(At(name));
-        if (At(at) != ",") return;
-        ++at;
+    const bool is_query = At(at) == "(";
+    if (!is_query && (!IsName(At(at)) || IsKeyword(At(at)))) return;
+    Table& table = tables_.emplace_back();
+    table.scope = scope;
+    table.is_natural = IsNaturalJoin(at);
+    table.is_target = is_target;
+    table.at = at;
+    if (is_query) {
+        table.query = MainQuery(at + 1);
+        at = operands_.Partner(at) + 1;
+    } else {
+        at = ReadTableName(pieces_, at, table.table);
+        table.name = table.table.name;
+        UseWith(table);
     }
+    if (IsWord(At(at), "as")) ++at;
+    if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
+    if (IsWord(At(at), "using"))
+        for (std::size_t name = at + 2; name < operands_.Partner(at + 1); name += 2) table.merged.push_back(At(name));
 }
 
 // natural [left|right|full] [outer|inner] join HERE
@@ -308,10 +324,11 @@ bool Names::IsNaturalJoin(std::size_t at) const {
     return IsWord(At(at - 1), "natural");
 }
 
-// A name that WITH has given hides a table's.
+// A name that WITH has given hides a table's, within the parentheses around it.
 void Names::UseWith(Table& table) const {
     for (const With& with : withs_) {
-        if (!table.table.schema.empty() || !IsSame(with.name, table.table.name)) continue;
+        const bool is_seen = with.seen.last == 0 || (table.at > with.seen.first && table.at < with.seen.last);
+        if (!is_seen || !table.table.schema.empty() || !IsSame(with.name, table.table.name)) continue;
         table.query = with.query;
         table.names = with.names;
     }

@@ -45,11 +45,12 @@ public:
     bool HasColumnOf(std::size_t select, const std::string& qualifier, TypeTest is_meant);
 
 private:
-    static constexpr int kDeepest = 30;      // a recursive query looks into itself
+    static constexpr int kDeepest = 30;      // subqueries within each other
     static constexpr int kMostLooks = 1000;  // subqueries that join each other twice and twice again
 
     // A table or subquery of the statement, where it is named.
     struct Table {
+        std::size_t at = 0;
         std::size_t scope = 0;
         bool is_target = false;    // of an insert
         std::string name;          // its alias, if it has one
@@ -61,6 +62,7 @@ private:
     };
     struct With {
         std::string name;
+        Span seen;                // between the parentheses around it; up to 0: everywhere
         std::size_t query = 0;
         std::vector<std::string_view> names;
     };
@@ -79,10 +81,12 @@ private:
 
     [[nodiscard]] std::string_view At(std::size_t index) const { return operands_.At(index); }
     Found FindName(std::string_view column, const std::string& qualifier, std::size_t scope);
+    Found FindInScope(std::string_view column, const std::string& qualifier, std::size_t scope);
     template <class Meant>
     Found Agreed(std::string_view name, Meant is_meant);
     Found ColumnOf(const Table& table, std::string_view name);
     Found ColumnOfQuery(const Table& table, const std::string& name);
+    bool IsTooDeep(std::string_view name);    // to look into one more subquery; the statement is refused then
     bool Expand(const Table& table, std::vector<Listed>& columns);
     bool ExpandQuery(std::size_t query, std::vector<Listed>& columns);
     static bool IsMerged(const Table& table, const std::string& name, const std::vector<Listed>& before);
@@ -93,7 +97,7 @@ private:
     [[nodiscard]] std::size_t MainQuery(std::size_t at) const;
     void NoteExcluded();
     void NoteWith(std::size_t open);
-    void ReadList(std::size_t at, std::size_t scope, bool is_target);
+    void ReadTable(std::size_t at, std::size_t scope, bool is_target);
     [[nodiscard]] bool IsNaturalJoin(std::size_t at) const;
     void UseWith(Table& table) const;
 

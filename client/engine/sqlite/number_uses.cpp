@@ -31,7 +31,7 @@ private:
     // Each operand of a chain once.
     void Concatenation(std::size_t at) {
         const Span left = operands_.OneBefore(at);
-        const std::string_view before = left.first > 0 ? operands_.At(left.first - 1) : std::string_view();
+        const std::string_view before = operands_.At(left.first - 1);
         if (before != "||" && !IsWord(before, "collate")) AsText(left);
         AsText(operands_.OneFrom(at + 1));
     }
@@ -41,15 +41,14 @@ private:
     }
 
     void Like(std::size_t at) {
-        const bool is_not = at > 0 && IsWord(operands_.At(at - 1), "not");
+        const bool is_not = IsWord(operands_.At(at - 1), "not");
         NumberAsText(operands_.Before(is_not ? at - 1 : at));
         NumberAsText(operands_.From(at + 1));
     }
 
     // A call of the engine's own that takes texts, whose parenthesis opens at `open`.
     void Call(std::size_t open) {
-        if (const std::size_t close = operands_.Partner(open); close < pieces_.size())
-            for (const Span argument : operands_.List({open, close + 1})) NumberAsText(argument);
+        for (const Span argument : operands_.List({open, operands_.Partner(open) + 1})) NumberAsText(argument);
     }
 
     void NumberAsText(Span span) {
@@ -75,15 +74,14 @@ private:
         return type == SQLT_CHR || type == SQLT_AFC || IsDateType(type) || IsIntervalType(type);
     }
 
-    // cast(e as integer), whose parenthesis opens at `open`; integers are told by the digits that they are given.
+    // cast(e as integer), whose parenthesis opens at `open`, or a table called so; integers are told by the digits that they are given.
     void Cast(std::size_t open) {
         constexpr std::uint8_t kDigits = 38;
         const std::size_t close = operands_.Partner(open);
         std::size_t as = open + 1;
         while (as < close && !IsWord(operands_.At(as), "as")) as = (operands_.At(as) == "(" ? operands_.Partner(as) : as) + 1;
         Column column;
-        if (as + 1 >= close || close >= pieces_.size() || !ReadDeclaredType(sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1)), column))
-            return;
+        if (as == close || !ReadDeclaredType(sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1)), column)) return;
         if (column.type == SQLT_NUM && column.precision == kDigits && column.scale == 0) Wrap({open + 1, as}, "kelp_whole(");
     }
 

@@ -71,15 +71,15 @@ Status ObjectValues::TableAllows(bool& allows) {
     return {};
 }
 
-Status ObjectValues::Take(std::span<Datum> values, bool may_fill) {
+Status ObjectValues::Take(std::span<Datum> values) {
     waiting_.clear();
-    if (!held_.empty()) std::vector<std::string>().swap(held_);    // of the row before
+    std::vector<std::string>().swap(held_);    // of the row before
     for (std::size_t index = 0; index < values.size(); ++index) {
         if (values[index].kind != Kind::lob) continue;
         auto* const lob = static_cast<Lob*>(const_cast<void*>(values[index].data));
         std::uint64_t length = 0;
         if (Status status = Measure(*lob, length); status.Failed()) return status;
-        const ObjectTarget* const target = may_fill ? FindTarget(index, *lob) : nullptr;
+        const ObjectTarget* const target = FindTarget(index, *lob);
         bool fills = target != nullptr;
         if (Status status = fills ? TableAllows(fills) : Status(); status.Failed()) return status;
         if (fills) waiting_.push_back({target, lob, length, nullptr});
@@ -151,10 +151,7 @@ Status ObjectValues::Fill(std::span<const std::int64_t> rows, std::uint64_t expe
 
 Status ObjectValues::FillRow(const Waiting& object, std::int64_t row) {
     OpenValue value;
-    if (Status status = value.Open(connection_, object.target->column, row, true); status.Failed()) {
-        refused_ = status.Number() == errors::kNoLobValue;    // the column is part of an index
-        return refused_ ? Status() : status;
-    }
+    if (Status status = value.Open(connection_, object.target->column, row, true); status.Failed()) return status;
     Lob& lob = object.copy ? *object.copy : *object.lob;
     std::vector<std::byte> block(kBlock);
     std::size_t read = 0;

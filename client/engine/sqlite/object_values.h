@@ -36,14 +36,13 @@ public:
     void Use(std::vector<ObjectTarget> targets) { targets_ = std::move(targets), allows_.reset(); }
 
     // Looks through the values of a row: objects that may be filled in later, if any may, stay; others are read.
-    Status Take(std::span<Datum> values, bool may_fill);
+    Status Take(std::span<Datum> values);
     [[nodiscard]] bool Any() const { return !waiting_.empty(); }
     [[nodiscard]] std::uint64_t LengthOf(const Datum& value) const;    // of one that stayed
 
     // Copies what the statement may change while it runs.
     Status Detach();
-    // Fills the objects into the rows, of which there should be so many. Refused says then whether they were others
-    // than that, or columns that SQLite does not write in blocks.
+    // Fills the objects into the rows, of which there should be so many. Refused says then whether they were others.
     Status Fill(std::span<const std::int64_t> rows, std::uint64_t expected);
     [[nodiscard]] bool Refused() const { return refused_; }
     // Reads those that stayed after all.

@@ -32,7 +32,7 @@ bool Contains(const List& list, std::string_view piece) {
 
 bool IsKeyword(std::string_view piece) {
     std::array<char, kLongestKeyword> lower;
-    if (piece.empty() || piece.size() > lower.size() || !std::isalpha(static_cast<unsigned char>(piece[0]))) return false;
+    if (piece.size() > lower.size() || !std::isalpha(static_cast<unsigned char>(piece[0]))) return false;
     std::transform(piece.begin(), piece.end(), lower.begin(),
                    [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
     return std::binary_search(std::begin(kKeywords), std::end(kKeywords), std::string_view(lower.data(), piece.size()));
@@ -59,11 +59,21 @@ Operands::Operands(const std::vector<std::string_view>& pieces) : pieces_(pieces
     }
 }
 
-// A word, literal, number or placeholder that is an operand, or begins one, by itself.
+std::size_t Operands::Around(std::size_t index) const {
+    while (index-- > 0) {
+        if (At(index) == ")") index = Partner(index);
+        else if (At(index) == "(") return index;
+    }
+    return pieces_.size();
+}
+
+// A word, literal, number or placeholder that is an operand, or begins one, by itself. Some keywords are names there.
 bool Operands::IsOperand(std::size_t index) const {
     const std::string_view piece = At(index);
     if (piece.empty() || IsWord(piece, "null")) return !piece.empty();
-    if (IsName(piece)) return !IsKeyword(piece);
+    if (IsName(piece) && IsKeyword(piece))
+        return IsOneOf(piece, {"end", "left", "right", "full", "cross", "inner", "outer", "match", "offset", "window"});
+    if (IsName(piece)) return true;
     return piece.back() == '\'' || IsNumber(piece) || ParameterOf(piece) != kNoParameter;
 }
 
@@ -72,13 +82,12 @@ bool Operands::IsOperand(std::size_t index) const {
 std::size_t Operands::OperandEnd(std::size_t first) const {
     std::size_t at = first;
     while (At(at) == "+" || At(at) == "-" || At(at) == "~") ++at;
-    if (At(at) == "(") return Partner(at) < pieces_.size() ? Partner(at) + 1 : first;
+    if (At(at) == "(") return Partner(at) + 1;
     if (IsWord(At(at), "case")) return CaseEnd(at);
     if (!IsOperand(at)) return first;
     ++at;
     while (At(at) == ".") at += 2;
-    if (At(at) != "(" || !IsName(At(at - 1))) return at;
-    if (Partner(at) >= pieces_.size()) return first;
+    if (At(at) != "(") return at;
     at = Partner(at) + 1;
     while ((IsWord(At(at), "over") || IsWord(At(at), "filter")) && At(at + 1) == "(") at = Partner(at + 1) + 1;
     return at;
@@ -116,20 +125,17 @@ Span Operands::From(std::size_t first) const {
 
 // Where the operand before `last` begins, without its signs; `last` itself when there is none.
 std::size_t Operands::OperandBegin(std::size_t last) const {
-    if (last == 0) return last;
     std::size_t at = last - 1;
-    if (IsWord(At(at), "end")) return CaseBegin(last);
+    if (IsWord(At(at), "end") && CaseBegin(last) < last) return CaseBegin(last);
     if (At(at) == ")") {
         at = Partner(at);
-        if (at >= pieces_.size()) return last;
-        const bool follows_call = at > 0 && (IsWord(At(at - 1), "over") || IsWord(At(at - 1), "filter"));
-        if (follows_call) return OperandBegin(at - 1);
-        if (at == 0 || !IsName(At(at - 1)) || IsKeyword(At(at - 1))) return at;
+        if (IsOneOf(At(at - 1), {"over", "filter"})) return OperandBegin(at - 1);
+        if (!IsName(At(at - 1)) || IsKeyword(At(at - 1))) return at;
         --at;
     } else if (!IsOperand(at)) {
         return last;
     }
-    while (at >= 2 && At(at - 1) == "." && IsName(At(at - 2))) at -= 2;
+    while (At(at - 1) == ".") at -= 2;
     return at;
 }
 
@@ -141,7 +147,7 @@ std::size_t Operands::BehindCollations(std::size_t at) const {
 Span Operands::Before(std::size_t last) const {
     while (IsWord(At(last - 2), "collate")) last -= 2;
     std::size_t begin = OperandBegin(last);
-    while (begin < last && begin > 0 && Contains(kArithmetic, At(begin - 1))) begin = OperandBegin(begin - 1);    // or a sign
+    while (Contains(kArithmetic, At(begin - 1))) begin = OperandBegin(begin - 1);    // or a sign
     return {begin, last};
 }
 
@@ -149,9 +155,9 @@ Span Operands::OneBefore(std::size_t last) const {
     std::size_t begin = OperandBegin(last);
     const auto is_sign = [&](std::size_t at) {
         const bool signs = At(at) == "+" || At(at) == "-" || At(at) == "~";
-        return signs && (at == 0 || OperandBegin(at) == at);
+        return signs && OperandBegin(at) == at;
     };
-    while (begin < last && begin > 0 && is_sign(begin - 1)) --begin;
+    while (begin < last && is_sign(begin - 1)) --begin;
     return {begin, last};
 }
 

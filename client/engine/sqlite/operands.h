@@ -13,11 +13,15 @@ class Operands {
 public:
     explicit Operands(const std::vector<std::string_view>& pieces);
 
+    // Empty behind the end, and before the start.
     [[nodiscard]] std::string_view At(std::size_t index) const {
         return index < pieces_.size() ? pieces_[index] : std::string_view();
     }
     // The parenthesis that belongs to the one at `index`; the end of the text for anything else.
     [[nodiscard]] std::size_t Partner(std::size_t index) const { return partners_[index]; }
+
+    // The parenthesis that opens around a piece; the end of the text where there is none.
+    [[nodiscard]] std::size_t Around(std::size_t index) const;
 
     // The expression that begins at `first`, or ends before `last`, as far as arithmetic and || go; empty when none is
     // understood.

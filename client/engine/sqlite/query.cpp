@@ -58,7 +58,7 @@ SqliteQuery::~SqliteQuery() { Close(); }
 SqliteQuery::Coercions SqliteQuery::CoercionsOf(const ValueTargets& targets, std::size_t parameters) {
     Coercions coercions(parameters);
     for (const auto& [index, column, purpose] : targets.parameters) {
-        if (index < parameters) coercions[index] = std::make_unique<Coercion>(column, purpose);
+        coercions[index] = std::make_unique<Coercion>(column, purpose);
     }
     return coercions;
 }
@@ -161,7 +161,7 @@ void SqliteQuery::DescribeFromRow() {
 // ---- Binding
 
 Status SqliteQuery::BindDate(int index, const date::DateTime& value, bool copy) {
-    if (dates_.empty()) dates_.resize(parameters_.size());
+    dates_.resize(parameters_.size());
     DateText& text = dates_[static_cast<std::size_t>(index) - 1];
     const std::string_view view = WriteDate(value, text);
     Datum written;
@@ -203,7 +203,7 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
 Status SqliteQuery::BindRow(RowSource& source, std::uint32_t row, bool copy) {
     if (parameters_.empty()) return {};
     Status status = source.Row(row, parameters_);
-    if (status.Ok()) status = objects_.Take(parameters_, !copy);
+    if (status.Ok()) status = objects_.Take(parameters_);
     for (std::size_t index = 0; index < parameters_.size() && status.Ok(); ++index) {
         if (coercions_[index]) status = coercions_[index]->Apply(parameters_[index]);
         if (status.Ok()) status = Bind(static_cast<int>(index) + 1, parameters_[index], copy);
@@ -238,8 +238,7 @@ Status SqliteQuery::DeliverRows(std::uint32_t row, RowSink& sink) {
 
 // What a sink refuses must be undone, which SQLite does for its own failures alone: the execution gets a mark.
 Status SqliteQuery::RunReturning(std::uint32_t row, RowSink& sink) {
-    const bool marked = connection_.InTransaction();
-    Status status = marked ? connection_.SetMark() : Status();
+    Status status = connection_.SetMark();
     if (!status.Ok()) return status;
     try {
         status = DeliverRows(row, sink);
@@ -247,8 +246,8 @@ Status SqliteQuery::RunReturning(std::uint32_t row, RowSink& sink) {
         status = NoMemory();
     }
     sqlite3_reset(statement_.get());    // a statement that runs holds its marks
-    if (status.Ok() && marked) status = connection_.DropMark();
-    if (status.Ok() || !marked || !connection_.InTransaction()) return status;
+    if (status.Ok()) status = connection_.DropMark();
+    if (status.Ok() || !connection_.InTransaction()) return status;
     Status undone = connection_.UndoToMark();
     if (undone.Ok()) undone = connection_.DropMark();
     return undone.Ok() ? status : undone;
@@ -257,7 +256,7 @@ Status SqliteQuery::RunReturning(std::uint32_t row, RowSink& sink) {
 // Through an execution whose rows nobody wants.
 Status SqliteQuery::StepThrough() {
     Status status;
-    for (bool has_row = true; has_row && status.Ok();) status = Step(has_row);
+    for (bool has_row = true; has_row;) status = Step(has_row);
     sqlite3_reset(statement_.get());
     return status;
 }
@@ -299,7 +298,7 @@ Status SqliteQuery::RunWithObjects() {
 Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) {
     Status status = BindRow(source, row, false);
     if (!status.Ok()) return status;
-    if (returned && sqlite3_column_count(statement_.get()) > 0) {
+    if (returned) {
         status = RunReturning(row, *returned);
     } else {
         const std::uint64_t told = connection_.ToldChanges();

@@ -13,12 +13,11 @@
 namespace engine::sqlite {
 namespace {
 
-// By SQLite's rules for the words of a declared type.
-bool HasRealAffinity(const std::string& declared) {
+// Whether the words of a declared type may mean so to SQLite.
+bool MayBeReal(const std::string& declared) {
     const std::string words = UpperCase(declared);
     const auto has = [&](const char* part) { return words.find(part) != std::string::npos; };
-    const bool is_other = has("INT") || has("CHAR") || has("CLOB") || has("TEXT") || has("BLOB");
-    return !is_other && (has("REAL") || has("FLOA") || has("DOUB"));
+    return has("REAL") || has("FLOA") || has("DOUB");
 }
 
 }  // namespace
@@ -26,12 +25,12 @@ bool HasRealAffinity(const std::string& declared) {
 bool KeepReturned(sqlite3* database, sqlite3_stmt* compiled, std::string_view sql, ValueTargets& targets) {
     if (sqlite3_stmt_readonly(compiled) != 0 || sqlite3_column_count(compiled) == 0) return false;
     PieceList pieces = Split(sql);
-    const bool with = !pieces.empty() && IsWord(pieces[0], "with");
+    const bool with = IsWord(pieces[0], "with");
     const std::size_t verb = with ? FindPiece(pieces, 0, {"insert", "update", "delete", "replace"}) : 0;
     pieces.erase(pieces.begin(), pieces.begin() + static_cast<std::ptrdiff_t>(verb));
     const std::optional<ListOfTable> read = ReadReturning(pieces);
     const std::vector<TableColumn> columns = read ? AllColumns(database, read->table) : std::vector<TableColumn>();
-    if (columns.empty() || !HasRealAffinity(columns.front().declared)) return false;
+    if (columns.empty() || !MayBeReal(columns.front().declared)) return false;
     std::string all;
     for (const TableColumn& column : columns) all += (all.empty() ? "+" : ", +") + QuotedName(column.name);
     for (std::size_t at = read->list.first; at < read->list.last; at = FindPiece(pieces, at, {","}) + 1) {

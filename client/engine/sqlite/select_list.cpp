@@ -61,7 +61,7 @@ std::string CastType(const std::vector<std::string_view>& pieces) {
 // Whether the pieces are numbers, calls, names and the like with nothing but arithmetic between them. Comparisons and
 // || are none, nor is what may be a name behind an operand.
 bool IsArithmetic(const std::vector<std::string_view>& pieces) {
-    const std::size_t first = !pieces.empty() && (pieces[0] == "-" || pieces[0] == "+") ? 1 : 0;
+    const std::size_t first = pieces[0] == "-" || pieces[0] == "+" ? 1 : 0;
     int depth = 0;
     bool calculates = first == 1;
     for (std::size_t index = first; index < pieces.size(); ++index) {
@@ -112,8 +112,9 @@ SelectItem ReadItem(std::string_view text) {
     std::vector<std::string_view> pieces = Split(text);
     SelectItem item;
     item.has_alias = CutAlias(pieces);
-    item.is_row_id = !pieces.empty() && IsWord(pieces.back(), "rowid") &&
-                     (pieces.size() == 1 || (pieces.size() == 3 && pieces[1] == "."));
+    const std::size_t size = pieces.size();
+    const bool is_name = size == 1 || (size <= 5 && pieces[1] == "." && pieces[size - 2] == ".");    // main.t.rowid
+    item.is_row_id = is_name && IsWord(pieces.back(), "rowid");
     item.type = ReadType(std::move(pieces)).declared;
     return item;
 }

@@ -31,12 +31,6 @@ TableColumn Described(const char* name, const char* declared) {
     return column;
 }
 
-std::string Quoted(const std::string& name) {
-    std::string quoted = "\"";
-    for (const char c : name) quoted.append(c == '"' ? 2 : 1, c);
-    return quoted += '"';
-}
-
 bool IsRowId(const std::string& name) {
     constexpr const char* kNames[] = {"rowid", "oid", "_rowid_"};
     return std::any_of(std::begin(kNames), std::end(kNames),
@@ -80,8 +74,8 @@ bool ReadColumn(sqlite3* database, const TableName& table, std::string_view name
 // The engine's own list leaves out those that are calculated.
 std::vector<TableColumn> AllColumns(sqlite3* database, const TableName& table) {
     std::vector<TableColumn> columns;
-    const std::string schema = table.schema.empty() ? "" : Quoted(table.schema) + '.';
-    const StatementHandle query = Compile(database, "select * from " + schema + Quoted(table.name));
+    const std::string schema = table.schema.empty() ? "" : QuotedName(table.schema) + '.';
+    const StatementHandle query = Compile(database, "select * from " + schema + QuotedName(table.name));
     for (int index = 0; index < sqlite3_column_count(query.get()); ++index)
         columns.push_back(Described(sqlite3_column_name(query.get(), index), sqlite3_column_decltype(query.get(), index)));
     return columns;

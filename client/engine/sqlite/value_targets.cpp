@@ -49,11 +49,10 @@ struct Mark {
     const ValueTargets::Edit* edit;
 };
 
-// At one place ends come before beginnings, inner ends before outer ones, outer beginnings before inner ones. Of two
-// edits of the same text the later one is the inner.
+// At one place are ends, inner ones before outer ones, or beginnings, outer ones first. Of two edits of the same text the
+// later one is the inner.
 bool ComesBefore(const Mark& left, const Mark& right) {
     if (left.at != right.at) return left.at < right.at;
-    if (left.ends != right.ends) return left.ends;
     if (left.other != right.other) return left.other > right.other;
     return left.ends ? left.edit > right.edit : left.edit < right.edit;
 }
