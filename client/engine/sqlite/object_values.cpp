@@ -32,7 +32,7 @@ std::vector<ObjectTarget> FindObjectTargets(sqlite3* database, const ValueTarget
     std::vector<ObjectTarget> found;
     for (const ValueTargets::Object& object : targets.objects) {
         TableName table = object.table;
-        if (!FindNumberedTable(database, table) || (table.schema != "main" && table.schema != "temp")) continue;
+        if (!FindNumberedTable(database, table)) continue;
         found.push_back({object.index, store.Column(table.schema, table.name, object.column, object.kind)});
     }
     return found;
@@ -43,8 +43,7 @@ std::vector<ObjectTarget> FindObjectTargets(sqlite3* database, const ValueTarget
 const ObjectTarget* ObjectValues::FindTarget(std::size_t parameter, const Lob& lob) const {
     const auto of_parameter = [&](const ObjectTarget& target) { return target.parameter == parameter; };
     const auto found = std::find_if(targets_.begin(), targets_.end(), of_parameter);
-    if (found == targets_.end() || found->column->kind != lob.Kind()) return nullptr;
-    return std::count_if(targets_.begin(), targets_.end(), of_parameter) == 1 ? &*found : nullptr;
+    return found == targets_.end() || found->column->kind != lob.Kind() ? nullptr : &*found;
 }
 
 // Asked once a compilation: definitions make a new one.

@@ -163,7 +163,6 @@ Status SqliteQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
     found = false;
     Status status = CheckOpen();
     if (!status.Ok()) return status;
-    if (!scrollable_) return Error(errors::kFetchOutOfSequence);
     status = Keep(position);
     if (!status.Ok()) return Ended(std::move(status));
     next_ = std::min(position, store_.Size());
@@ -177,7 +176,6 @@ Status SqliteQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
 Status SqliteQuery::Count(std::uint64_t& rows) {
     Status status = CheckOpen();
     if (!status.Ok()) return status;
-    if (!scrollable_) return Error(errors::kFetchOutOfSequence);
     status = Keep(std::numeric_limits<std::uint64_t>::max());
     if (!status.Ok()) return Ended(std::move(status));
     rows = store_.Size();
