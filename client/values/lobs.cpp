@@ -57,7 +57,7 @@ template <LobKind kind, bool national>
 int PutLocator(const Datum& datum, Workspace& workspace, Target& target) {
     LobDescriptor* const descriptor = DescriptorAt(target.at);
     if (!descriptor) return errors::kInvalidLocator;
-    if (!workspace.lobs || !workspace.lobs->store) return errors::kInconsistentTypes;
+    if (!workspace.lobs->store) return errors::kInconsistentTypes;
     descriptor->Set({});    // what it held may be a copy, whose room the next one takes
     std::shared_ptr<engine::Lob> lob;
     if (const int error = TakeLob(datum, kind, workspace, lob)) return error;
@@ -79,14 +79,14 @@ const ByOrigin<OutConverter> kToBlob = kLocatorRow<PutLocator<LobKind::bytes, fa
 
 int ReadLob(const Datum& datum, LobSession* session, std::uint64_t most, std::string& content, Datum& value,
             std::uint64_t& length) {
-    if (!session || !session->store) return errors::kInconsistentTypes;
+    if (!session->store) return errors::kInconsistentTypes;
     std::shared_ptr<engine::Lob> lob;
     if (Status status = session->store->Take(datum, true, lob); !status.Ok()) return status.Number();
     return ReadFrom(*lob, most, content, value, length);
 }
 
 int TakeLong(const Datum& datum, LobSession* session, std::shared_ptr<engine::Lob>& lob) {
-    if (!session || !session->store) return errors::kInconsistentTypes;
+    if (!session->store) return errors::kInconsistentTypes;
     std::uint64_t length = 0;
     Status status = session->store->Take(datum, true, lob);
     if (status.Ok()) status = lob->Length(length);
@@ -103,9 +103,9 @@ int ReadLocator(const Located& located, Workspace& workspace, Datum& value) {
     const LobSession* const session = workspace.lobs.get();
     if (!located.lob) return errors::kInvalidLocator;
     if (located.session && !located.IsOf(session)) return errors::kForeignLocator;
-    if (session && session->Waits(located.kept)) return errors::kUpdatedLocator;
+    if (session->Waits(located.kept)) return errors::kUpdatedLocator;
     std::uint64_t length = 0;
-    if (session && session->store && session->store->TakesObjects()) {
+    if (session->store && session->store->TakesObjects()) {
         if (Status status = located.lob->Length(length); !status.Ok()) return status.Number();
     }
     if (length <= engine::kHeldWhole) return ReadFrom(*located.lob, kWholeLob, workspace.content, value, length);
