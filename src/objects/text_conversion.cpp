@@ -29,10 +29,10 @@ bool IsUtf16Literal(const char* input, uint32_t length) {
 }
 
 // Converts without a message. Room for every code page: the largest takes four bytes for a UTF-16 unit of two.
-int FromUtf16(const void* text, size_t length, std::string& output) {
+int FromUtf16(const void* text, size_t length, std::string& output, size_t most = SIZE_MAX) {
     output.clear();
     if (text == nullptr || length == 0) return 0;
-    output.resize(2 * length + 1);
+    output.resize(std::min(2 * length + 1, most));
     size_t unused = 0;
     const int rc = CodePageConvert(kCodePageUtf16, EffectiveCodePage(), text, length, nullptr, output.data(),
                                    output.size(), &unused);
@@ -84,8 +84,8 @@ int convertToUTF16(const char* input, uint32_t input_length, char* output, uint3
     return rc;
 }
 
-bool convertFromUTF16(const void* text, size_t length, std::string& output) {
-    const int rc = FromUtf16(text, length, output);
+bool convertFromUTF16(const void* text, size_t length, std::string& output, size_t most) {
+    const int rc = FromUtf16(text, length, output, most);
     if (IsTolerated(rc)) return true;
     SayNotConverted(rc);
     return false;

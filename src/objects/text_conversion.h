@@ -17,8 +17,9 @@ int convertToUTF16(const char* input, uint32_t input_length, char* output, uint3
 // Whether a result of convertToUTF16 counts as success: 0, or one of the service's warnings (truncated, substituted).
 bool IsTolerated(int result);
 
-// A UTF-16 text of the library as the application code page shows it. False after a failure, which has been printed.
-bool convertFromUTF16(const void* text, size_t length, std::string& output);
+// A UTF-16 text of the library as the application code page shows it: of one that takes more than `most` bytes, the whole
+// characters that go into them. False after a failure, which has been printed.
+bool convertFromUTF16(const void* text, size_t length, std::string& output, size_t most = SIZE_MAX);
 
 // Adds a text of the library to a line, converted when `utf16`. After a failed conversion the line is printed as far as
 // it goes, the failure after it, and false returned.

@@ -50,8 +50,7 @@ bool ReadDiagnostic(const char* room, size_t room_size, std::string& text) {
     if (!Utf16Mode) {
         text.assign(room, strnlen(room, room_size));
     } else {
-        if (!convertFromUTF16(room, utf::Utf16Length(room, room_size), text)) return false;
-        if (text.size() > kLongestText) text.resize(kLongestText);
+        if (!convertFromUTF16(room, utf::Utf16Length(room, room_size), text, kLongestText)) return false;
     }
     text = NormaliseDiagnostic(std::move(text));
     return true;
