@@ -39,7 +39,6 @@ struct WordCounts {
     bool from_there_on = false;  // any count above the highest bit is taken as well
 
     constexpr bool Has(int count) const {
-        if (count < 0) return false;
         if (count < 64 && (bits >> count & 1) != 0) return true;
         return from_there_on && (count >= 64 || (bits >> count) == 0);
     }

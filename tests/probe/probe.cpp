@@ -497,6 +497,7 @@ constexpr auto kSwitched =
 #include "platform/client_functions.def"
 #undef FUNCTION
 
+extern "C" { __attribute__((visibility("default"))) xa_switch_t emptyXaSwitch; }    // without any entry
 xa_switch_t rmXaSwitch = {
     "probe", TMNOFLAGS, 0,
     kSwitched<&xa_switch_t::xa_open_entry, 0>,     kSwitched<&xa_switch_t::xa_close_entry, 1>,
