@@ -16,16 +16,15 @@ class CallText {
 public:
     CallText(const Environment& environment, const OraText* text, std::size_t length, bool utf16) {
         if (!text) return;
-        const bool two_bytes = environment.Utf16() || utf16;
-        const bool native = utf16 && !environment.Utf16();
-        if (native) valid_ = utf::ToUtf8(text, Utf16Length(text, length), converted_);
-        else if (two_bytes) Convert(environment, {reinterpret_cast<const char*>(text), Utf16Length(text, length)});
-        if (two_bytes) {
+        const auto* begin = reinterpret_cast<const char*>(text);
+        if (environment.Utf16() || utf16) {
+            length = Utf16Length(text, length);
+            if (environment.Utf16()) Convert(environment, {begin, length});
+            else valid_ = utf::ToUtf8(text, length, converted_);
             view_ = converted_;
             return;
         }
         const void* zero = std::memchr(text, 0, length);
-        const auto* begin = reinterpret_cast<const char*>(text);
         view_ = {begin, zero ? static_cast<std::size_t>(static_cast<const char*>(zero) - begin) : length};
         if (!environment.Converts()) return;
         Convert(environment, view_);

@@ -112,7 +112,7 @@ Status SetAttribute(Object& object, const void* source, std::uint32_t size, std:
     if (row->size != 0 && size != row->size) return Error(errors::kBadAttributeSize);
     AttributeValue value;
     if (!row->looks_at_value) return row->set(object, value);
-    if (row->shape == Shape::handle || row->shape == Shape::descriptor) {
+    if (row->shape == Shape::handle) {
         value.pointer = const_cast<void*>(source);
         return row->set(object, value);
     }

@@ -107,7 +107,7 @@ bool BytesToUtf8(const ByteTable& table, std::string_view text, std::string& utf
         const char16_t unit = table.characters[static_cast<unsigned char>(byte)];
         if (unit == kNone) return false;
         if (unit < 0x80) utf8 += static_cast<char>(unit);
-        else if (!utf::ToUtf8(&unit, sizeof unit, utf8)) return false;
+        else utf::ToUtf8(&unit, sizeof unit, utf8);
     }
     return true;
 }
@@ -120,7 +120,7 @@ char ByteFor(const ByteTable& table, char16_t unit) {
 
 // One byte a character: the second half of a pair adds none.
 void UnitsToBytes(const ByteTable& table, std::string_view units, std::string& text) {
-    for (std::size_t at = 0; at + 1 < units.size(); at += 2) {
+    for (std::size_t at = 0; at < units.size(); at += 2) {
         const auto unit = static_cast<char16_t>(static_cast<unsigned char>(units[at]) |
                                                 static_cast<unsigned char>(units[at + 1]) << 8);
         if ((unit & 0xFC00) != 0xDC00) text += ByteFor(table, unit);
@@ -168,7 +168,7 @@ bool IsUtf8(const CharacterSet& set) noexcept { return set.form == Form::utf8; }
 bool IsUtf16(const CharacterSet& set) noexcept { return set.form == Form::utf16 || set.form == Form::utf16_high_first; }
 std::string_view Blank(const CharacterSet& set) noexcept {
     constexpr std::string_view kHighFirst("\0 ", 2), kLowFirst(" \0", 2);
-    return set.form == Form::utf16 ? kLowFirst : set.form == Form::utf16_high_first ? kHighFirst : " ";
+    return set.form == Form::utf16 ? kLowFirst : kHighFirst;
 }
 
 bool ToUtf8(const CharacterSet& set, std::string_view text, std::string& utf8) {

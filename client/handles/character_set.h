@@ -27,7 +27,7 @@ int MostBytes(const CharacterSet& set) noexcept;       // of a character
 bool IsFixedWidth(const CharacterSet& set) noexcept;
 bool IsUtf8(const CharacterSet& set) noexcept;
 bool IsUtf16(const CharacterSet& set) noexcept;        // of either byte order: units of two bytes
-std::string_view Blank(const CharacterSet& set) noexcept;
+std::string_view Blank(const CharacterSet& set) noexcept;    // of two bytes
 
 // Appends the whole text. False for what is no text in the set.
 bool ToUtf8(const CharacterSet& set, std::string_view text, std::string& utf8);

@@ -21,7 +21,7 @@ constexpr std::size_t kLargestBlock = std::size_t{1} << 36;    // what is larger
 // The application's functions may align to less than objects need: their block's own address stands before ours.
 void* AllocateFrom(const MemoryFunctions& memory, std::size_t size) noexcept {
     if (size > kLargestBlock) return nullptr;
-    if (!memory.allocate) return std::calloc(1, size ? size : 1);
+    if (!memory.allocate) return std::calloc(1, size);
     void* block = memory.allocate(memory.context, size + 2 * kAlignment);
     if (!block) return nullptr;
     const auto address = (reinterpret_cast<std::uintptr_t>(block) + 2 * kAlignment - 1) / kAlignment * kAlignment;

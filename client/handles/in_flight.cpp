@@ -151,7 +151,6 @@ bool IsEnvironment(const Object& object) { return !object.Parent(); }
 }  // namespace
 
 void RetiredObjects::Append(Queue& queue, Object& object) noexcept {
-    object.next_ = nullptr;
     (queue.last ? queue.last->next_ : queue.first) = &object;
     queue.last = &object;
 }

@@ -63,7 +63,7 @@ Slot* FindSlot(const Table& table, const void* pointer) {
     const Word address = AddressOf(pointer);
     for (std::size_t index = table.Home(address);; index = table.Next(index)) {
         const Word found = table.slots[index].load(std::memory_order_relaxed);
-        if (AddressIn(found) == address && found != kEmpty) return &table.slots[index];
+        if (AddressIn(found) == address) return &table.slots[index];
         if (found == kEmpty) return nullptr;
     }
 }

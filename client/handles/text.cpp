@@ -39,7 +39,7 @@ std::string_view TextOut(const Environment& environment, std::string_view utf8, 
 
 bool TextToBuffer(const Environment& environment, std::string_view utf8, void* buffer, std::size_t size) {
     const std::size_t zero = environment.Utf16() ? 2 : 1;
-    if (!buffer || size < zero) return false;
+    if (size < zero) return false;
     std::string converted;
     const std::string_view text = TextOut(environment, utf8, converted);
     const std::size_t room = size - zero;

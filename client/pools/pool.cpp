@@ -79,7 +79,7 @@ void Pool::Exit(PoolPlace& place) noexcept {
 // something else happens.
 void Pool::TakeExpired(RestingList& expired) noexcept {
     const std::chrono::seconds most(settings_->idle_seconds.load(std::memory_order_relaxed));
-    if (most.count() == 0 || resting_.empty()) return;
+    if (most.count() == 0) return;
     const Clock::time_point now = Clock::now();
     while (!resting_.empty() && Total() > size_.least && now - resting_.front().since >= most)
         expired.splice(expired.end(), resting_, resting_.begin());
@@ -131,17 +131,15 @@ public:
 
     // Opens the rest, to rest; an error ends it.
     Status OpenAll() {
-        Status status;
-        while (count_ > 0 && !status.Failed()) {
+        while (count_ > 0) {
             Connected connected;
-            status = pool_.Connect(pool_.plan_.own, connected);
-            if (status.Failed()) break;
+            if (Status status = pool_.Connect(pool_.plan_.own, connected); status.Failed()) return status;
             PoolPlace& place = PlaceOf(connected);
             RestingList node = std::move(place.node_);
             node.front() = {std::move(connected), Clock::now()};
             if (!Admit(place, &node)) return Error(pool_.plan_.gone);
         }
-        return status;
+        return {};
     }
 
 private:

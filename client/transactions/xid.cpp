@@ -1,7 +1,6 @@
 // Reading and writing identifiers.
 #include "transactions/xid.h"
 
-#include <algorithm>
 #include <cstring>
 
 namespace transactions {
@@ -32,7 +31,7 @@ XID WriteXid(const engine::Xid& from) {
 engine::Xid XidOfName(std::string_view name) {
     engine::Xid xid;
     xid.format = kFormatOfNames;
-    xid.global_length = static_cast<std::uint8_t>(std::min<std::size_t>(name.size(), MAXGTRIDSIZE));
+    xid.global_length = static_cast<std::uint8_t>(name.size());
     name.copy(xid.data.data(), xid.global_length);
     return xid;
 }

@@ -100,9 +100,9 @@ Answer TakeUpAgain(const Call& call, xa_long flags) {
     if (flags & TMRESUME ? !resumable : held->rest != Rest::idle) return XAER_PROTO;
     if (held->user != call.GetLink().user) return {XAER_RMERR, Error(errors::kOtherUsersBranch)};
     if (held->work->doom != 0) return AnswerOf(Error(held->work->doom));
-    status = transactions::TakeUp(call.GetLink(), held, Family::xa);
-    if (status.Ok()) hold.Over();
-    return AnswerOf(std::move(status));
+    transactions::TakeUp(call.GetLink(), held, Family::xa);
+    hold.Over();
+    return XA_OK;
 }
 
 // The work is given up: nothing is left to lock.
