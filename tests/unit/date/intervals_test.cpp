@@ -64,6 +64,11 @@ TEST_F(IntervalCalls, TextsAreReadAndWritten) {
     EXPECT_EQ(length, 6u);
     EXPECT_EQ(Answer(OCIIntervalToText(env_, err_, Read("2-3", true), 2, 0, Text(area), 6, &length)), 0);
     EXPECT_STREQ(area, "+02-03??");
+    for (const size_t room : {size_t{7}, size_t{1} << 32}) {
+        EXPECT_EQ(Answer(OCIIntervalToText(env_, err_, Read("2-3", true), 2, 0, Text(area), room, &length)), 0);
+        EXPECT_STREQ(area, "+02-03") << room;
+        area[6] = '?';
+    }
 }
 
 TEST_F(IntervalCalls, PartsHaveLimitsAndOneSign) {
@@ -113,6 +118,8 @@ TEST_F(IntervalCalls, WhatIsUnset) {
     EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, moment, unset, none)), 1866);
     EXPECT_EQ(Answer(OCIIntervalCheck(env_, err_, Read("1"), &flags)), 0);
     EXPECT_EQ(flags, 0u);
+    MUST(Answer(OCI_datetimeSetTime(env_, err_, unset, 1, 2, 3, 4)));
+    EXPECT_EQ(Shown(unset, "SS"), "1866") << "a time without a date";
 }
 
 TEST_F(IntervalCalls, SumsCarryAndCompare) {
@@ -197,6 +204,7 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
     const struct { const char* text; const char* name; int hour, minute, winter; } zones[] = {
         {"2024-07-15 00:00:00 Europe/Paris", "Europe/Paris", 2, 0, 1}, {"2024-07-15 00:00:00 -03:30", "-03:30", -3, -30, -3},
         {"2024-07-15 00:00:00 +00:00", "+00:00", 0, 0, 0}, {"2024-07-15 00:00:00 +14:00", "+14:00", 14, 0, 14}};
+    auto* plain = Moment("2024-07-15 00:00:00.5", OCI_DTYPE_TIMESTAMP);
     for (const auto& c : zones) {
         sb1 hour = 0, minute = 0, winter = 99;
         ub1 name[20];
@@ -212,9 +220,9 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
         size = 5;
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneName(env_, err_, moment, name, &size)), 22059);
         EXPECT_EQ(size, 12u);
+        EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneName(env_, err_, plain, name, &size)), 1878);
     }
     sb1 hour = 0, minute = 0;
-    auto* plain = Moment("2024-07-15 00:00:00.5", OCI_DTYPE_TIMESTAMP);
     EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, plain, &hour, &minute)), 1878);
     auto* date = NewDescriptor<OCIDateTime>(OCI_DTYPE_DATE);
     EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, date, 2024, 7, 16, 13, 14, 15, 0, nullptr, 0)), 0);

@@ -110,7 +110,8 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     const auto moves = [](dvoid* context, const dvoid* data, oraub8 length, ub1, dvoid** changed, oraub8* room_there) -> sb4 {
         static_cast<std::string*>(context)->append(static_cast<const char*>(data), length) += '|';
         static char wider[5];
-        return *changed = wider, *room_there = sizeof wider, OCI_CONTINUE;
+        if (length < sizeof wider) *changed = wider, *room_there = sizeof wider;    // else it stays
+        return OCI_CONTINUE;
     };
     EXPECT_EQ(Answer(OCILobRead2(svc, err, other, &(bytes = 0), nullptr, 1, room, 2, OCI_FIRST_PIECE, &(taken = ""), moves, 0, 0)), 0);
     EXPECT_EQ(taken, "\xC3\xA4|xyabc|\xC3\xA4z|");
@@ -167,7 +168,9 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     Fetch(lob);
     Fetch(other, "select b from l for update", SQLT_BLOB);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
-    EXPECT_EQ(Answer(OCILobGetChunkSize(svc, err, lob, nullptr)), 21560);
+    EXPECT_EQ(Answer(OCILobGetChunkSize(svc, err, lob, nullptr)) + Answer(OCILobIsOpen(svc, err, lob, nullptr)), 2 * 21560);
+    EXPECT_EQ(Answer(OCILobGetChunkSize(svc, err, lob, &length)) + length, 65536u);
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, nullptr, 1, room, 5, 0, nullptr, nullptr, 0, 0)), 21560);
     EXPECT_EQ(Answer(OCILobErase(svc, err, lob, nullptr, 1)), 21560);
     EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, nullptr, nullptr, 1, room, 5, 0, nullptr, nullptr, 0, 0)), 21560);
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &length, 1, nullptr, 4, nullptr, nullptr, 0, 0)), 24803);

@@ -41,7 +41,7 @@ TEST_F(FileCalls, OpeningsLeaveNoDescriptors) {
     const struct { const char* name; ub4 mode, create; sb4 answer; } cases[] = {
         {"made", OCI_FILE_READ_WRITE, OCI_FILE_EXCL, 0}, {"made", OCI_FILE_READ_WRITE, OCI_FILE_EXCL, 30151},
         {"made", OCI_FILE_READ_ONLY, OCI_FILE_TRUNCATE, 0}, {".", OCI_FILE_READ_ONLY, OCI_FILE_EXIST, 30158},
-        {"made", 4, OCI_FILE_CREATE, 30150}, {"made", OCI_FILE_READ_WRITE, 16, 30150}};
+        {"made", 0, OCI_FILE_CREATE, 30150}, {"made", 4, OCI_FILE_CREATE, 30150}, {"made", OCI_FILE_READ_WRITE, 16, 30150}};
     for (const auto& c : cases) {
         OCIFileObject* file = nullptr;
         ASSERT_EQ(Open(c.name, c.mode, c.create, &file), c.answer) << c.name << ' ' << c.mode << ' ' << c.create;
@@ -57,6 +57,7 @@ TEST_F(FileCalls, OpeningsLeaveNoDescriptors) {
     ASSERT_EQ(Open("made", OCI_FILE_READ_WRITE, OCI_FILE_EXIST, &file), 0);
     EXPECT_EQ(Answer(OCIFileRead(env_, err_, file, &count, kHuge, &count)), 30150) << "the system's own refusal";
     EXPECT_EQ(Answer(OCIFileWrite(env_, err_, file, nullptr, 0, &count)), 30150);
+    EXPECT_EQ(Answer(OCIFileSeek(env_, err_, file, 0, 0, OCI_FILE_FORWARD)), 30150);
     std::string name(300, 'n');
     ubig_ora length = 7;
     ub1 exists = 7;

@@ -6,9 +6,9 @@
 namespace {
 
 struct NlsCalls : CallFixture {
-    void Nls(ub2 set, ub2 national = 0) {
+    void Nls(ub2 set, ub2 national = 0, ub4 mode = OCI_DEFAULT) {
         Close();
-        EXPECT_EQ(OCIEnvNlsCreate(&env_, OCI_DEFAULT, nullptr, nullptr, nullptr, nullptr, 0, nullptr, set, national),
+        EXPECT_EQ(OCIEnvNlsCreate(&env_, mode, nullptr, nullptr, nullptr, nullptr, 0, nullptr, set, national),
                   OCI_SUCCESS) << set;
         err_ = New<OCIError>(OCI_HTYPE_ERROR);
     }
@@ -37,7 +37,7 @@ TEST_F(NlsCalls, TextsAreConverted) {
         {31, 873, "€😁é", 9, 0, "??\xe9"}, {1, 873, "é", 9, 0, "?"}, {873, 1, "\x80", 9, 24501, ""},
         {873, 178, "\x81", 9, 24501, ""}, {31, 873, "\xc3", 9, 24501, ""}, {873, 31, "a\xe9", 2, 22059, "a"},
         {2000, 873, "\U0010FFFF", 3, 22059, ""}, {7, 873, "a", 9, 24329, ""}, {873, 873, "ab", 0, 22059, ""},
-        {2000, 873, "longer than one", 1, 22059, ""}, {31, 873, {}, 8, 0, ""}};
+        {2000, 873, "longer than one", 1, 22059, ""}, {31, 873, {}, 8, 0, ""}, {873, 7, "a", 9, 24329, ""}, {0, 31, "\xe9", 9, 0, "é"}};
     for (const auto& c : edges) EXPECT_EQ(convert(c.to, c.from, c.text, c.room), std::pair(c.answer, c.result)) << c.text;
     ub2 units[4] = {};
     char bytes[8] = "";
@@ -66,8 +66,10 @@ TEST_F(NlsCalls, NamesAndSettings) {
         EXPECT_STREQ(text, c.name);
     }
     EXPECT_EQ(OCINlsCharSetNameToId(env_, Text("al32Utf8")), 873);
-    EXPECT_EQ(OCINlsCharSetNameToId(env_, Text("none")) + OCINlsCharSetNameToId(nullptr, Text("UTF8")), 0);
-    EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), 4, 871), OCI_ERROR);
+    for (const char* const name : {"none", "UTF8\x81"}) EXPECT_EQ(OCINlsCharSetNameToId(env_, Text(name)), 0);
+    EXPECT_EQ(OCINlsCharSetNameToId(nullptr, Text("UTF8")), 0);
+    for (const auto& [room, id] : {std::pair(0, 871), {4, 871}, {9, 7}})
+        EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), room, id), OCI_ERROR) << room;
     const struct { ub2 item; const char* text; } items[] = {
         {1, "Sunday"}, {7, "Saturday"}, {8, "Sun"}, {14, "Sat"}, {15, "January"}, {26, "December"}, {27, "Jan"},
         {38, "Dec"}, {41, "AM"}, {42, "PM"}, {43, "AD"}, {44, "BC"}, {45, "."}, {46, ","}, {49, "DD-MON-RR"},
@@ -95,8 +97,11 @@ TEST_F(NlsCalls, NamesAndSettings) {
     unsetenv("LC_ALL");
     EXPECT_EQ(OCINlsEnvironmentVariableGet(&id, 1, OCI_NLS_CHARSET_ID, 0, nullptr), OCI_ERROR);
     OCIEnv* none = nullptr;
-    EXPECT_EQ(OCIEnvNlsCreate(&none, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr, 7, 0), OCI_ERROR);
+    for (const auto& [set, national] : {std::pair(7, 0), {873, 7}})
+        EXPECT_EQ(OCIEnvNlsCreate(&none, 0, nullptr, nullptr, nullptr, nullptr, 0, nullptr, set, national), OCI_ERROR);
     EXPECT_EQ(none, nullptr);
+    Nls(0, 31, OCI_UTF16);
+    EXPECT_EQ(Attribute<ub2>(env_, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
     Nls(2000);
     for (const size_t room : {9u, 10u})
         EXPECT_EQ(OCINlsCharSetIdToName(env_, Text(text), room, 871), room == 10 ? OCI_SUCCESS : OCI_ERROR);
@@ -168,7 +173,8 @@ TEST_F(NlsCalls, TextsOfValuesThatAreNone) {
     OraText area[80];
     ub4 size = sizeof area;
     OCINumberSetZero(err_, &number);
-    MUST(Answer(OCIDateSysDate(err_, &day)), Answer(OCIDateTimeSysTimeStamp(env_, err_, moment)));
+    ub1 exists = 0;
+    MUST(Answer(OCIDateSysDate(err_, &day)), Answer(OCIDateTimeSysTimeStamp(env_, err_, moment)), OCIFileInit(env_, err_));
     const OraText *const bad = Text("\x81"), *const one = Text("1"), *const nine = Text("9"), *const year = Text("Y");
     const sb4 answers[] = {
         Answer(OCINumberToText(err_, &number, bad, 1, nullptr, 0, &size, area)),
@@ -188,6 +194,8 @@ TEST_F(NlsCalls, TextsOfValuesThatAreNone) {
         Answer(OCIDateTimeFromText(env_, err_, one, 1, bad, 1, nullptr, 0, moment)),
         Answer(OCIDateTimeFromText(env_, err_, one, 1, year, 1, bad, 1, moment)),
         Answer(OCIDateTimeConstruct(env_, err_, moment, 2024, 2, 29, 0, 0, 0, 0, const_cast<OraText*>(bad), 1)),
+        Answer(OCIFileExists(env_, err_, const_cast<OraText*>(bad), const_cast<OraText*>(one), &exists)),
+        Answer(OCIFileExists(env_, err_, const_cast<OraText*>(one), const_cast<OraText*>(bad), &exists)),
         Answer(OCIIntervalFromText(env_, err_, bad, 1, interval))};
     for (std::size_t index = 0; index < std::size(answers); ++index) EXPECT_EQ(answers[index], 24501) << index;
 }

@@ -61,6 +61,7 @@ TEST_F(Transactions, WhatRestsTooLongIsRolledBack) {
     EXPECT_EQ(Answer(OCITransRollback(svc_[1], err_, OCI_DEFAULT)), 0);
     EXPECT_EQ(OCITransMultiPrepare(svc_[1], 1, &branch, &err_), OCI_ERROR);
     EXPECT_EQ(FirstCode(err_), 24761) << "with the one whose transaction it shares";
+    EXPECT_EQ(Answer(OCITransRollback(svc_[0], err_, 1)), 24300);
     EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24761);
     EXPECT_EQ(Start(0, 0, OCI_TRANS_RESUME), 24756);
 }
