@@ -45,7 +45,7 @@ public:
             return;
         }
         std::erase_if(values_, [](const KeyValue& old) { return !old.key->alive; });
-        if (value) values_.push_back({key, value});
+        values_.push_back({key, value});
     }
 
     void* Get(const KeyState& key) {
