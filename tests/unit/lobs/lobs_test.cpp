@@ -170,7 +170,7 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, nullptr)), 21560);
     EXPECT_EQ(Answer(OCILobGetChunkSize(svc, err, lob, nullptr)) + Answer(OCILobIsOpen(svc, err, lob, nullptr)), 2 * 21560);
     EXPECT_EQ(Answer(OCILobGetChunkSize(svc, err, lob, &length)) + length, 65536u);
-    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, nullptr, 1, room, 5, 0, nullptr, nullptr, 0, 0)), 21560);
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, nullptr, 1, room, 5, nullptr, nullptr, 0, 0)), 21560);
     EXPECT_EQ(Answer(OCILobErase(svc, err, lob, nullptr, 1)), 21560);
     EXPECT_EQ(Answer(OCILobRead2(svc, err, lob, nullptr, nullptr, 1, room, 5, 0, nullptr, nullptr, 0, 0)), 21560);
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &length, 1, nullptr, 4, nullptr, nullptr, 0, 0)), 24803);

@@ -115,7 +115,7 @@ TEST_F(NullArguments, OfObjects) {
     EXPECT_EQ(OCIFileInit(env_, err_) + OCIThreadInit(env_, err_) + OCIThreadMutexInit(env_, err_, &mutex) +
                   OCIThreadIdInit(env_, err_, &id), 0);
     Compare({{".hh30150..", Nulls(OCIFileOpen, env_, err_, &file, text, text, ub4{1}, ub4{0}, ub4{OCI_FILE_STDIN})},
-             {".hhn", Nulls(OCIThreadMutexDestroy, env_, err_, &mutex)}, {".hhhhn", Nulls(OCIThreadIdSame, env_, err_, id, id, &same)},
+             {".hhn", Nulls(OCIThreadMutexDestroy, env_, err_, &mutex)}, {".hhnnn", Nulls(OCIThreadIdSame, env_, err_, id, id, &same)},
              {".hhn", Nulls(OCIStringResize, env_, err_, 0, &string)},
              {"1410hnnh", Nulls(OCIRowidToChar, NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID), text_, &length, err_)},
              {"nhnn", Nulls(OCIArrayDescriptorAlloc, env_, &array, OCI_DTYPE_LOB, 0, 0, nullptr)},
