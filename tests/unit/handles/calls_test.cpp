@@ -85,6 +85,7 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
             OCIReset(bad, err_),
             OCIPasswordChange(svc, err_, buf, 2, buf, 2, buf, 2, 0),
             OCIServerVersion(bad, err_, buf, 15, OCI_HTYPE_SVCCTX),
+            OCIServerVersion(other, err_, buf, 15, OCI_HTYPE_TRANS),
             OCIServerVersion(server, err, buf, 15, OCI_HTYPE_SERVER)};
         for (std::size_t call = 0; call < std::size(refused); ++call)
             EXPECT_EQ(refused[call], OCI_INVALID_HANDLE) << call;

@@ -56,6 +56,7 @@ TEST_F(FileCalls, OpeningsLeaveNoDescriptors) {
     ub4 count = 0;
     ASSERT_EQ(Open("made", OCI_FILE_READ_WRITE, OCI_FILE_EXIST, &file), 0);
     EXPECT_EQ(Answer(OCIFileRead(env_, err_, file, &count, kHuge, &count)), 30150) << "the system's own refusal";
+    EXPECT_EQ(Answer(OCIFileRead(env_, err_, file, &count, 256U << 20, &count)), 0) << "an empty file";
     EXPECT_EQ(Answer(OCIFileWrite(env_, err_, file, nullptr, 0, &count)), 30150);
     EXPECT_EQ(Answer(OCIFileSeek(env_, err_, file, 0, 0, OCI_FILE_FORWARD)), 30150);
     std::string name(300, 'n');

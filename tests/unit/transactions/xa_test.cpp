@@ -77,6 +77,7 @@ TEST_F(XaCalls, NullArguments) {
         EXPECT_EQ((rmXaSwitch.*entry)(nullptr, 1, entry == kEnd ? TMSUCCESS : TMNOFLAGS), XAER_INVAL);
     for (const long count : {1, -1, 0})
         EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, count, 1, TMSTARTRSCAN), count == 0 ? 0 : XAER_INVAL);
+    EXPECT_EQ(rmXaSwitch.xa_recover_entry(nullptr, 1, 1, TMASYNC), XAER_ASYNC);
     int handle = 0, result = 0;
     EXPECT_EQ(rmXaSwitch.xa_complete_entry(nullptr, &result, 1, TMNOFLAGS), XAER_INVAL);
     EXPECT_EQ(rmXaSwitch.xa_complete_entry(&handle, nullptr, 1, TMNOFLAGS), XAER_INVAL);
