@@ -65,6 +65,8 @@ TEST_F(FileCalls, OpeningsLeaveNoDescriptors) {
     SHOULD(Answer(OCIFileGetLength(env_, err_, Text(name), Text(folder_), &length)) - 30160,
            Answer(OCIFileExists(env_, err_, Text(name), Text(folder_), &exists)) - 30160);
     EXPECT_EQ(length * exists, 49u) << "no answer";
+    EXPECT_EQ(Answer(OCIFileOpen(env_, err_, &file, Text("ostype"), Text("/proc/sys/kernel"), OCI_FILE_READ_ONLY,
+                                 OCI_FILE_TRUNCATE, OCI_FILE_BIN)), 30157) << "what nobody can empty";
 }
 
 // A thread waits in a read from a pipe, another in a close behind it, further ones behind that: the close is done once,

@@ -69,6 +69,14 @@ TEST_F(ThreadCalls, AThreadThatNobodyKnows) {
     while (destroyed == 0) std::this_thread::yield();
 }
 
+// A value that is set anew by the function that takes it away is taken away a few times, then no more.
+TEST_F(ThreadCalls, ValuesThatComeBack) {
+    static Work work{env_, err_};
+    work.key = NewKey([](dvoid* value) { OCIThreadKeySet(work.env, work.err, work.key, value), ++destroyed; });
+    std::thread([] { OCIThreadKeySet(work.env, work.err, work.key, &work); }).join();
+    EXPECT_EQ(destroyed, 4);
+}
+
 // Without room for its stack there is no thread, and what was to become its id and handle stay what they were.
 TEST_F(ThreadCalls, AThreadThatCannotStart) {
     OCIThreadHandle* handle = NewHandle();
