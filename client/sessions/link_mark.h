@@ -38,7 +38,10 @@ public:
     }
 
 private:
-    bool TakeStanding() { return std::exchange(is_set_, false) && !link_->Closed() && link_->Engine().InTransaction(); }
+    bool TakeStanding() {
+        is_set_ = false;
+        return !link_->Closed() && link_->Engine().InTransaction();
+    }
 
     const std::shared_ptr<Link> link_;
     bool began_ = false;
