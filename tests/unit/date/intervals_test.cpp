@@ -259,14 +259,14 @@ TEST_F(IntervalCalls, TypesOfMoments) {
         EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, value, 2024, 7, 16, 13, 14, 15, 0, Text("Asia/Tokyo"), 10)), 0);
         EXPECT_EQ(Shown(value, "", 6), c.made);
         EXPECT_EQ(Answer(OCIDateTimeConvert(env_, err_, tokyo, value)), 0);
-        if (c.converted) EXPECT_EQ(Shown(value, "", 6), c.converted);
+        if (c.converted) { EXPECT_EQ(Shown(value, "", 6), c.converted); }
         EXPECT_EQ(Answer(OCI_datetimeSetDate(env_, err_, value, 2025, 1, 15)), c.date);
         EXPECT_EQ(Answer(OCIDateTimeGetDate(env_, err_, value, &year, &month, &day)), c.date);
         EXPECT_EQ(Answer(OCI_datetimeSetTime(env_, err_, value, 1, 2, 3, 0)), c.time);
         EXPECT_EQ(Answer(OCIDateTimeGetTime(env_, err_, value, &month, &day, &second, &fraction)), c.time);
         EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, value, tokyo, &order)), c.compared);
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), c.zone);
-        if (c.type == OCI_DTYPE_TIME_TZ) EXPECT_EQ(hour * 60 + minute, 540) << "not that of the year 0";
+        if (c.type == OCI_DTYPE_TIME_TZ) { EXPECT_EQ(hour * 60 + minute, 540) << "not that of the year 0"; }
         for (OCIDateTime* left : {value, tokyo}) {
             EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, left, left == value ? tokyo : value,
                                                  NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS))), c.moved);

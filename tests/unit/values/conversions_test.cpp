@@ -45,7 +45,7 @@ TEST_F(Conversions, IntervalColumns) {
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_DS), "!1867") << "never set";
     EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_YM), "!932") << "the other span";
     EXPECT_EQ(Answer(OCIIntervalFromText(env, err, Bytes("1 0:0:0.000000001"), 17, days)), 0);
-    if (!OnServer()) EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_DS), "'+01 00:00:00.000000001'");
+    if (!OnServer()) { EXPECT_EQ(In(Raw(days), SQLT_INTERVAL_DS), "'+01 00:00:00.000000001'"); }
     EXPECT_EQ(Query("select '1 0:0:0' from dual", {{&months, 8, SQLT_INTERVAL_DS}}), 932);
     MustRun("create table spans(ym interval year to month, ds interval day to second, n number)");
     const struct { const char *ym, *ds; } cases[] = {
