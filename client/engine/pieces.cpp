@@ -7,12 +7,14 @@
 #include <iterator>
 
 namespace engine {
-namespace {
 
-bool IsDigit(char c) { return c >= '0' && c <= '9'; }
 bool IsWordCharacter(char c) {
     return std::isalnum(static_cast<unsigned char>(c)) || c == '_' || c == '$' || (c & 0x80) != 0;
 }
+
+namespace {
+
+bool IsDigit(char c) { return c >= '0' && c <= '9'; }
 
 // The longer of two that begin alike stands first.
 constexpr std::string_view kOperators[] = {"->>", "->", "<=", ">=", "<>", "!=", "==", "||", "<<", ">>"};

@@ -38,6 +38,8 @@ PieceList Split(std::string_view sql);
 
 std::string Lower(std::string_view text);    // of ASCII letters
 
+bool IsWordCharacter(char c);    // which another one beside it would make longer
+
 // Without regard to letter case; `lower` is in lower case.
 bool IsWord(std::string_view piece, std::string_view lower);
 

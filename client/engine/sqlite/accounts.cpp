@@ -98,7 +98,7 @@ Status TakeOwnership(SqliteConnection& connection, const Credentials& credential
     if (status.Ok()) status = HasAccounts(connection, has_accounts);
     if (status.Ok() && !has_accounts) {
         const std::string hash = NewHash(credentials.password);
-        status = hash.empty() ? Error(errors::kInternalError, "password cannot be hashed")
+        status = hash.empty() ? Error(errors::kBadLogon)
                               : Run(connection, "insert into main.kelp_accounts(name, password) values(?1, ?2)",
                                     {Folded(credentials.user), hash}, nullptr, nullptr);
         taken = status.Ok();

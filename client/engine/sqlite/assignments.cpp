@@ -143,7 +143,7 @@ private:
             more = Is(at, ",");
             if (more) ++at;
         }
-        writes_alike_ = lists == 1 && (at == pieces_.size() || Is(at, ";"));
+        writes_alike_ = lists == 1 && at == pieces_.size();
     }
 
     // The expressions of the list that opens at `open`, one a column; answers where the text goes on behind it.
@@ -158,7 +158,7 @@ private:
     }
 
     void InsertQuery(std::size_t at, const Columns& targets) {
-        std::size_t end = FindWord(at, {"returning", "conflict", ";"});
+        std::size_t end = FindWord(at, {"returning", "conflict"});
         const bool has_conflict = Is(end, "conflict");
         if (has_conflict) --end;    // ON
         WrapQuery({at, end}, targets, has_conflict);
@@ -200,7 +200,7 @@ private:
     void Set(std::size_t at) {
         while (Is(at, "set") || Is(at, ",")) {
             const std::size_t end =
-                FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", "on", ";"});
+                FindWord(at + 1, {",", "from", "where", "returning", "order", "limit", "on"});
             if (Is(at + 1, "(")) SetRow({at + 1, end});
             else Assign({at + 3, end}, FindColumn(pieces_[at + 1]));
             at = end;

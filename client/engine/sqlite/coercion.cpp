@@ -215,7 +215,6 @@ Status Coercion::ApplyBinary(Datum& value) {
 }
 
 Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {
-    if (!number::IsValid(number)) return Refuse(errors::kInvalidNumber);
     number_ = number;
     int failure = 0;
     if (column_.type == SQLT_BFLOAT || column_.type == SQLT_BDOUBLE) {
@@ -231,12 +230,11 @@ Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {
 }
 
 // As the engine writes numbers that it keeps as texts.
-Status Coercion::WriteNumber(Datum& value) {
+void Coercion::WriteNumber(Datum& value) {
     std::size_t length = 0;
     text_.resize(number::kMaxPlainText);
     if (value.kind == Kind::decimal) {
-        const int failure = number::ToPlainText(*static_cast<const OCINumber*>(value.data), '.', text_.data(), &length);
-        if (failure != 0) return Refuse(failure);
+        (void)number::ToPlainText(*static_cast<const OCINumber*>(value.data), '.', text_.data(), &length);
     } else {
         const auto room = static_cast<int>(text_.size());
         if (value.kind == Kind::integer) sqlite3_snprintf(room, text_.data(), "%lld", static_cast<long long>(value.integer));
@@ -244,7 +242,6 @@ Status Coercion::WriteNumber(Datum& value) {
         length = std::strlen(text_.data());
     }
     Set(value, Kind::text, text_.data(), length);
-    return {};
 }
 
 void Coercion::WriteBytes(Datum& value) {
@@ -257,9 +254,7 @@ Status Coercion::ApplyText(Datum& value) {
     switch (value.kind) {
         case Kind::integer:
         case Kind::real:
-        case Kind::decimal:
-            if (Status status = WriteNumber(value); status.Failed()) return status;
-            break;
+        case Kind::decimal: WriteNumber(value); break;
         case Kind::bytes: WriteBytes(value); break;
         case Kind::timestamp: SetDate(value.Timestamp(), value); break;
         case Kind::row_id: return Refuse(errors::kInconsistentTypes);

@@ -33,7 +33,7 @@ private:
     void KeepAmongReals(Datum& value);
     Status ApplyDecimal(const OCINumber& number, Datum& value);
     Status ApplyText(Datum& value);
-    Status WriteNumber(Datum& value);
+    void WriteNumber(Datum& value);
     void WriteBytes(Datum& value);
     Status ApplyBytes(Datum& value);
     Status ApplyDate(Datum& value);

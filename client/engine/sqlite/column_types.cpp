@@ -193,10 +193,6 @@ std::optional<LobKind> ObjectKindOf(const Column& column) {
     }
 }
 
-bool IsLob(const Column& column) {
-    return ObjectKindOf(column) && column.type != SQLT_LNG && column.type != SQLT_LBI;
-}
-
 bool IsNumberType(std::uint16_t type) {
     return type == SQLT_NUM || type == SQLT_BFLOAT || type == SQLT_BDOUBLE;
 }

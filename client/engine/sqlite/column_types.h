@@ -23,6 +23,5 @@ bool IsIntervalType(std::uint16_t type);
 
 // What a column of large objects or long values holds; none of other columns.
 std::optional<LobKind> ObjectKindOf(const Column& column);
-bool IsLob(const Column& column);    // rather than a long one
 
 }  // namespace engine::sqlite

@@ -138,7 +138,7 @@ TextArgument::TextArgument(sqlite3_value* value, std::string_view usual) : text_
     OCINumber number;
     std::size_t length = 0;
     failure_ = ReadNumber(value, number);
-    if (failure_ == 0) failure_ = number::ToPlainText(number, '.', digits_.data(), &length);
+    if (failure_ == 0) (void)number::ToPlainText(number, '.', digits_.data(), &length);
     text_ = {digits_.data(), length};
 }
 

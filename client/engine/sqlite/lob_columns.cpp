@@ -95,7 +95,7 @@ private:
     // What is neither text nor bytes is not read where it lies. Nor are long values that are not very long.
     [[nodiscard]] std::string Number(const TableColumn& column) const {
         const std::string value = Name() + '.' + QuotedName(column.name);
-        if (!IsLob(column.column))
+        if (column.column.type == SQLT_LNG || column.column.type == SQLT_LBI)
             return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) when typeof(" +
                    value + ") = 'blob' and length(" + value + ") > " + std::to_string(kHeldWhole) + " then " + Name() +
                    ".rowid else " + value + " end";

@@ -68,14 +68,19 @@ std::string ValueTargets::Rewritten(std::string_view text) const {
         marks.push_back({edit.end, edit.begin, true, &edit});
     }
     std::stable_sort(marks.begin(), marks.end(), ComesBefore);
+    const auto append = [&](std::string_view part) {    // which may have stood in quotes beside a word
+        const bool joins = !rewritten.empty() && !part.empty() && IsWordCharacter(rewritten.back()) && IsWordCharacter(part.front());
+        rewritten.append(joins ? " " : "").append(part);
+    };
     std::size_t copied = 0;
     for (const Mark& mark : marks) {
         const bool skips = mark.ends && mark.edit->replaces;
-        if (!skips) rewritten.append(text.substr(copied, mark.at - copied));
-        rewritten.append(mark.ends ? mark.edit->after : mark.edit->before);
+        if (!skips) append(text.substr(copied, mark.at - copied));
+        append(mark.ends ? mark.edit->after : mark.edit->before);
         copied = mark.at;
     }
-    return rewritten.append(text.substr(copied));
+    append(text.substr(copied));
+    return rewritten;
 }
 
 Status Convert(std::string_view text, const Column& column, Coercion::Purpose purpose, std::string& literal) {
