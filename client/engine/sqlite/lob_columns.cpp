@@ -56,13 +56,21 @@ public:
             RewriteItem({begin, end});
             begin = end + 1;
         }
-        return index_ == columns;
+        return index_ == columns && !uses_alias_;
     }
     std::vector<LobItem> items;
     std::vector<ValueTargets::Edit> edits;
 
 private:
     std::string Name() const { return read_.alias.empty() ? QuotedName(read_.table.name) : std::string(read_.alias); }
+
+    // Whether an item's name is meant behind the list, where it would be the row number.
+    [[nodiscard]] bool IsUsed(std::string_view name) const {
+        const std::string alias = PlainName(name);
+        return std::any_of(pieces_.begin() + static_cast<std::ptrdiff_t>(read_.list.last), pieces_.end(), [&](std::string_view piece) {
+            return IsName(piece) && sqlite3_stricmp(PlainName(piece).c_str(), alias.c_str()) == 0;
+        });
+    }
 
     void RewriteItem(Span item) {
         const bool qualified = item.Size() >= 3 && pieces_[item.first + 1] == ".";
@@ -75,6 +83,7 @@ private:
         if ((behind && !alias) || !IsName(pieces_[name])) return;
         TableColumn column;
         if (!ReadColumn(database_, read_.table, pieces_[name], column) || !ObjectKindOf(column.column)) return;
+        uses_alias_ = uses_alias_ || (alias && IsUsed(pieces_[item.last - 1]));
         Note(index, column);
         edits.push_back({Begin(item.first), End(name), Number(column), {}, true});
     }
@@ -114,6 +123,7 @@ private:
     const bool is_query_;    // else KeepReturned says why there is a plus
     LobStore& store_;
     std::size_t index_ = 0;
+    bool uses_alias_ = false;
 };
 
 // SQLite tells the declared types of a select list, not of what a change returns.
