@@ -217,7 +217,15 @@ private:
         else AssignList(equals + 1, targets);
     }
 
+    // Without the parentheses around a single piece.
+    Span Bare(Span span) const {
+        Span bare = span;
+        while (bare.Size() > 2 && Is(bare.first, "(")) bare = {bare.first + 1, bare.last - 1};
+        return bare.Size() == 1 ? bare : span;
+    }
+
     void Assign(Span span, const TableColumn* target) {
+        span = Bare(span);
         NoteObject(span, target);
         const std::size_t index = span.Size() == 1 ? ParameterOf(pieces_[span.first]) : kNoParameter;
         if (target && index != kNoParameter && (target->concerned || ObjectKindOf(target->column))) {
