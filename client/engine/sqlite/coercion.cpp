@@ -46,6 +46,7 @@ constexpr int kMostPower = static_cast<int>(std::size(kPowersOfTen)) - 1;
 constexpr int kExactPower = 15;                        // powers of ten and products below are exact in a real
 constexpr double kLargestExact = 9007199254740992.0;   // 2^53
 constexpr double kLargestNumber = 1e126;               // what a number cannot hold any more
+constexpr double kSmallNumber = 1e-129;                // below which it may not hold it
 
 void Set(Datum& value, Kind kind, const void* data, std::size_t length) {
     value.kind = kind;
@@ -169,8 +170,10 @@ Status Coercion::ApplyDigits(Datum& value) {
         number::FromInt64(value.integer, &number_);
         return ApplyDecimal(number_, value);
     }
-    if (column_.type == SQLT_NUM && !(std::fabs(value.real) < kLargestNumber)) return Refuse(errors::kNumericOverflow);
-    if (!limited || IsPlainReal(value.real, precision, scale)) return {};
+    const bool of_number = column_.type == SQLT_NUM;
+    if (of_number && !(std::fabs(value.real) < kLargestNumber)) return Refuse(errors::kNumericOverflow);
+    const bool may_vanish = of_number && purpose_ == Purpose::store && std::fabs(value.real) < kSmallNumber && value.real != 0;
+    if (!may_vanish && (!limited || IsPlainReal(value.real, precision, scale))) return {};
     const int failure = number::FromReal15(value.real, &number_);
     return failure == 0 ? ApplyDecimal(number_, value) : Refuse(failure);
 }

@@ -174,7 +174,7 @@ Status SqliteConnection::Make(std::string_view sql, Compilation& made, std::uint
         return Failure(database, code);
     }
     if (!made.statement) return Error(errors::kInvalidStatement).From("SQLITE");
-    if (CompileText(sql.substr(end), code, nullptr) || (code & 0xFF) == SQLITE_ERROR || code == SQLITE_AUTH) {
+    if (CompileText(sql.substr(end), code, nullptr) || (code & 0xFF) == SQLITE_ERROR) {
         error_offset = static_cast<std::uint32_t>(end);
         return Error(errors::kNotProperlyEnded).From("SQLITE");
     }
