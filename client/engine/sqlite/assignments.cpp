@@ -85,7 +85,7 @@ private:
         const std::size_t at = FindWord(type, {"default"});
         std::size_t literal = at + 1;
         if (at >= definition.last) return {};
-        const bool has_sign = Is(literal, "-") || Is(literal, "+");
+        const bool has_sign = IsSign(literal);
         if (has_sign) ++literal;
         const bool is_number = IsNumber(pieces_[literal]);
         if (!is_number && !(IsLiteral(pieces_[literal]) && !has_sign)) return {};
@@ -217,11 +217,13 @@ private:
         else AssignList(equals + 1, targets);
     }
 
-    // Without the parentheses around a single piece.
+    bool IsSign(std::size_t index) const { return Is(index, "-") || Is(index, "+"); }
+
+    // Without the parentheses around a single piece, or one with a sign.
     Span Bare(Span span) const {
         Span bare = span;
-        while (bare.Size() > 2 && Is(bare.first, "(")) bare = {bare.first + 1, bare.last - 1};
-        return bare.Size() == 1 ? bare : span;
+        while (bare.Size() > 2 && Is(bare.first, "(") && Is(bare.last - 1, ")")) bare = {bare.first + 1, bare.last - 1};
+        return bare.Size() == (IsSign(bare.first) ? 2 : 1) ? bare : span;
     }
 
     void Assign(Span span, const TableColumn* target) {
@@ -233,9 +235,9 @@ private:
             return;
         }
         if (!target || !target->concerned || IsHarmless(span, *target)) return;
-        const std::string quote = IsLongNumber(span) ? "'" : "";
-        targets_.edits.push_back(
-            {Begin(span.first), End(span.last - 1), "kelp_store(" + quote, quote + Described(*target)});
+        const std::string number = LongNumber(span);
+        targets_.edits.push_back({Begin(span.first), End(span.last - 1), number.empty() ? "kelp_store(" : "kelp_store('" + number + '\'',
+                                  Described(*target), !number.empty()});
     }
 
     void NoteObject(Span span, const TableColumn* target) {
@@ -245,12 +247,14 @@ private:
             targets_.objects.push_back({index, table_, target->name, *kind});
     }
 
-    // A literal of a number with more digits than a real keeps: it is read as text.
-    bool IsLongNumber(Span span) const {
-        const std::string_view text = sql_.substr(Begin(span.first), End(span.last - 1) - Begin(span.first));
-        const auto digits = std::count_if(text.begin(), text.end(), [](unsigned char c) { return std::isdigit(c); });
-        return digits > kExactDigits &&
-               text.find_first_not_of("0123456789.", text[0] == '-' ? 1 : 0) == std::string_view::npos;
+    // A literal of a number with more digits than a real keeps, which is read as text; none for anything else.
+    std::string LongNumber(Span span) const {
+        const bool has_sign = span.Size() == 2 && IsSign(span.first);
+        const std::string_view number = pieces_[span.last - 1];
+        if (span.Size() > (has_sign ? 2 : 1) || number.find_first_not_of("0123456789.eE+-") != number.npos) return {};
+        const std::string_view digits = number.substr(0, number.find_first_of("eE"));
+        if (std::count_if(digits.begin(), digits.end(), [](unsigned char c) { return std::isdigit(c); }) <= kExactDigits) return {};
+        return std::string(has_sign ? pieces_[span.first] : "").append(number);
     }
 
     // A null, and a plain number for a column of numbers without limits.
