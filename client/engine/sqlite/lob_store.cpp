@@ -192,7 +192,6 @@ void ColumnLob::NoteWrite() { Store().Note(*column_, row_, false); }
 
 Status ColumnLob::Write(std::uint64_t offset, std::span<const std::byte> in) {
     if (Status status = CheckWrite(); status.Failed()) return status;
-    if (in.empty()) return {};
     const auto limit = static_cast<std::uint64_t>(sqlite3_limit(Store().connection_.Database(), SQLITE_LIMIT_LENGTH, -1));
     if (offset + in.size() + kOtherColumns > limit) return Error(errors::kLobTooLarge).From("SQLITE");
     NoteWrite();
@@ -454,10 +453,12 @@ Status LobStore::FlushWhole(Draft& draft, sqlite3_stmt* statement) {
     return RunUpdate(statement);
 }
 
-// A value half written must not stay: the transaction goes with it.
+// A value half written must not stay: the transaction goes with it. What is part of an index is not written in pieces.
 Status LobStore::FlushInPieces(Draft& draft, sqlite3_stmt* statement) {
+    Status status = open_.Open(connection_, draft.column, draft.row, true);
+    if (status.Number() == errors::kNoLobValue) return FlushWhole(draft, statement);
     sqlite3_bind_zeroblob64(statement, 1, draft.bytes.Size());
-    Status status = RunUpdate(statement);
+    if (status.Ok()) status = RunUpdate(statement);
     if (status.Failed()) return status;
     status = open_.Open(connection_, draft.column, draft.row, true);
     std::vector<std::byte> block(kBlock);
