@@ -82,7 +82,7 @@ private:
         while (as < close && !IsWord(operands_.At(as), "as")) as = (operands_.At(as) == "(" ? operands_.Partner(as) : as) + 1;
         Column column;
         if (as == close || !ReadDeclaredType(sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1)), column)) return;
-        if (column.type == SQLT_NUM && column.precision == kDigits && column.scale == 0) Wrap({open + 1, as}, "kelp_whole(");
+        if (column.type == SQLT_NUM && column.precision == kDigits) Wrap({open + 1, as}, "kelp_whole(");
     }
 
     void Wrap(Span span, const char* call) {
