@@ -108,8 +108,7 @@ private:
     }
 
     // The word that decides: the first one; behind WITH the first verb outside parentheses.
-    const Leading* Decisive() const {
-        std::size_t index = 0;
+    const Leading* Decisive(std::size_t index) const {
         while (tokens_[index].Is("(")) ++index;
         if (!At(tokens_, index).Is("with")) return FindLeading(At(tokens_, index));
         int depth = 0;
@@ -123,7 +122,7 @@ private:
     }
 
     void FindType() {
-        const Leading* row = Decisive();
+        const Leading* row = Decisive(0);
         if (!row || !ExplainsStatement(row)) return Fail(errors::kInvalidStatement, tokens_[0]);
         result_.type = row->type;
         run_ = row->run;
@@ -146,6 +145,9 @@ private:
         std::unordered_map<std::string, std::uint32_t> names;
         for (std::size_t index = 0; index < tokens_.size(); ++index) {
             const Token& token = tokens_[index];
+            const Token& next = At(tokens_, index + 1);
+            if (token.Is("$") && next.kind == TokenKind::number && next.begin == token.End())
+                return Fail(errors::kInvalidCharacter, token);    // an engine would take it for a placeholder
             if (token.kind != TokenKind::placeholder) continue;
             if (IsIndicator(tokens_, index)) {
                 result_.placeholders.back().indicator = PlaceholderName(token.text);
@@ -202,7 +204,7 @@ private:
         step.begin = first < last ? Offset(tokens_[first].begin) : 0;
         step.end = first < last ? Offset(tokens_[last - 1].End()) : 0;
         if (run == Run::change || (run == Run::query && result_.is_block)) FindInto(step, first, last);
-        if (run == Run::query) step.locks_rows = LocksRows(first, last);
+        if (run == Run::query || run == Run::open_cursor || run == Run::assign) step.locks_rows = LocksRows(first, last);
         result_.steps.push_back(std::move(step));
     }
 
@@ -234,10 +236,14 @@ private:
         }
     }
 
-    // By `for update`, in a subquery too.
+    // By `for update`, in a subquery too, or by a change in the place of one.
     bool LocksRows(std::size_t first, std::size_t last) const {
-        for (std::size_t index = first; index + 1 < last; ++index)
-            if (tokens_[index].Is("for") && tokens_[index + 1].Is("update")) return true;
+        for (std::size_t index = first; index + 1 < last; ++index) {
+            const Token& next = tokens_[index + 1];
+            if (tokens_[index].Is("for") && next.Is("update")) return true;
+            const Leading* row = tokens_[index].Is("(") && !next.Is("replace") ? FindLeading(next) : nullptr;
+            if (row && row->run == Run::change) return true;
+        }
         return false;
     }
 
@@ -269,8 +275,10 @@ private:
         const Token& verb = tokens_[first];
         if (verb.Is("null") && first + 1 == last) return AddTargeted(Run::nothing, first, last, last);
         if (verb.Is("open") && At(tokens_, first + 1).kind == TokenKind::placeholder &&
-            At(tokens_, first + 2).Is("for"))
-            return AddTargeted(Run::open_cursor, first + 1, first + 3, last);
+            At(tokens_, first + 2).Is("for")) {
+            const Leading* row = Decisive(first + 3);
+            return row && row->run == Run::query && AddTargeted(Run::open_cursor, first + 1, first + 3, last);
+        }
         if (verb.kind == TokenKind::placeholder && At(tokens_, first + 1).Is(":="))
             return AddTargeted(Run::assign, first, first + 2, last);
         const Leading* row = FindLeading(verb);

@@ -46,7 +46,7 @@ struct Step {
     std::uint32_t end = 0;
     std::uint32_t cut_begin = 0;
     std::uint32_t cut_end = 0;
-    bool locks_rows = false;       // select ... for update
+    bool locks_rows = false;       // select ... for update, or one with changes in it
     std::vector<std::uint32_t> targets;
 };
 
