@@ -61,7 +61,7 @@ enum class Effect : std::uint8_t {
 struct StatementSource {
     std::string_view sql;
     Effect effect = Effect::reads;
-    // The kind of each placeholder's values. Empty: nothing is bound yet, the engine guesses or compiles later.
+    // The kind of each placeholder's values; null: nothing is bound to it.
     std::span<const Kind> parameters;
 };
 
@@ -205,8 +205,6 @@ public:
     // start of the text.
     virtual Status Compile(const StatementSource& source, std::unique_ptr<Query>& query,
                            std::uint32_t& error_offset) = 0;
-    // A query over the rows of a fetched result set (Kind::cursor), open.
-    virtual Status OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) = 0;    // 932 for anything else
 
     // Does nothing within a transaction. A read-only or serializable one sees what was there when it began; a change
     // within a read-only one is refused (1456).

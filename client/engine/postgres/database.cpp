@@ -144,23 +144,6 @@ Status PgConnection::Another(std::shared_ptr<const StopRequest> stop, std::uniqu
     return status;
 }
 
-// A query over the rows of a cursor of the transaction: its name, which is quoted, for it may be any.
-Status PgConnection::OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) {
-    if (cursor.kind != Kind::cursor) return Refused(errors::kInconsistentTypes);
-    std::string sql = "fetch all from \"";
-    for (const char c : cursor.Text()) sql.append(c == '"' ? 2 : 1, c);
-    sql += '"';
-    std::unique_ptr<Query> made;
-    std::uint32_t offset = 0;
-    if (Status status = Compile({sql, Effect::reads, {}}, made, offset); !status.Ok()) return status;
-    struct : RowSource {
-        Status Row(std::uint32_t, std::span<Datum>) override { return {}; }
-    } none;
-    if (Status status = made->Open(none, {}); !status.Ok()) return status;
-    query = std::move(made);
-    return {};
-}
-
 Status Open(const std::string& url, std::unique_ptr<Database>& database) {
     if (Status status = LoadLibpq(); !status.Ok()) return status;
     auto home = std::make_shared<Home>(url);

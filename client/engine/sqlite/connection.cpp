@@ -240,8 +240,6 @@ StatementHandle SqliteConnection::CompileText(std::string_view sql, int& code, s
     return StatementHandle(compiled);
 }
 
-Status SqliteConnection::OpenCursor(const Datum&, std::unique_ptr<Query>&) { return Error(errors::kInconsistentTypes); }
-
 Status SqliteConnection::CompileOwn(Own own) noexcept {
     const auto index = static_cast<std::size_t>(own);
     if (owns_[index]) return {};

@@ -53,7 +53,6 @@ public:
     Status ChangePassword(const std::string& user, const std::string& old_password,
                           const std::string& new_password) override;
     Status Compile(const StatementSource& source, std::unique_ptr<Query>& query, std::uint32_t& error_offset) override;
-    Status OpenCursor(const Datum& cursor, std::unique_ptr<Query>& query) override;
     Status Begin(TransactionMode mode) override;
     Status Commit() override;
     Status Rollback() override;
