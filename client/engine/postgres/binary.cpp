@@ -71,7 +71,6 @@ int NumericTo(std::string_view bytes, NumericValue& value) noexcept {
     if (count < 0 || bytes.size() < kHeader + 2 * static_cast<std::size_t>(count)) return errors::kInvalidNumber;
     value.is_integer = count <= weight + 1 && weight < 4;    // below 10^16
     if (value.is_integer) {
-        value.integer = 0;
         for (int index = 0; index <= weight; ++index) {
             value.integer = value.integer * kBase + (index < count ? Get<std::int16_t>(digits + 2 * index) : 0);
         }

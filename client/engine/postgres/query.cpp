@@ -25,10 +25,7 @@ Verb VerbOf(std::string_view sql) {
         Verb verb;
     } kVerbs[] = {{"insert", Verb::insert}, {"update", Verb::update}, {"delete", Verb::remove}};
     for (const auto& [word, verb] : kVerbs) {
-        const bool same = sql.size() > word.size() && std::equal(word.begin(), word.end(), sql.begin(), [](char a, char b) {
-            return a == (b >= 'A' && b <= 'Z' ? static_cast<char>(b - 'A' + 'a') : b);
-        });
-        if (same) return verb;
+        if (IsWord(sql.substr(0, word.size()), word)) return verb;
     }
     return Verb::other;
 }
@@ -80,7 +77,7 @@ PgQuery::~PgQuery() {
 bool PgQuery::RetypesTimes(std::vector<Oid>& types) const {
     bool any = false;
     types = bound_.Types();
-    for (std::size_t index = 0; index < std::min(types.size(), kinds_.size()); ++index) {
+    for (std::size_t index = 0; index < kinds_.size(); ++index) {
         const bool misread = kinds_[index] == Kind::timestamp && types[index] != oid::kTimestamp &&
                              types[index] != oid::kMoment;
         types[index] = misread ? oid::kTimestamp : TypeOf(kinds_[index]);
@@ -91,10 +88,10 @@ bool PgQuery::RetypesTimes(std::vector<Oid>& types) const {
 
 // insert ... values, of one row or a few: whose row ids are few, too.
 bool PgQuery::InsertsRows() const {
-    if (verb_ != Verb::insert || effect_ != Effect::changes || sql_.ends_with(';')) return false;
+    if (verb_ != Verb::insert) return false;
     const std::string lower = Lower(sql_);
     const auto has = [&](const char* words) { return lower.find(words) != std::string::npos; };
-    return has("values") && !has("select") && !has("returning") && !has("--");
+    return has("values") && !has("select") && !has("returning");
 }
 
 // Some of what is asked on the way may fail, but not if it takes the transaction with it.
@@ -185,7 +182,6 @@ Status PgQuery::SendPrepared(const std::string& name, const std::string& text, c
     Status status = connection_.PassGuard(guard);
     for (int command = 0; status.Ok() && command < 2;) {
         Result result = server.Next();
-        if (server.Broken()) break;
         if (!result) ++command;
         else if (IsFailure(result.get())) {
             status = server.Answer(result.get());
@@ -219,11 +215,7 @@ Status PgQuery::DescribeColumns(const PGresult* result) {
     at_hand_.values.resize(columns_.size());
     readers_.resize(columns_.size());
     binary_ = true;
-    has_cursors_ = false;
-    for (int index = 0; index < count; ++index) {
-        binary_ = binary_ && BinaryReader(PQftype(result, index));
-        has_cursors_ = has_cursors_ || PQftype(result, index) == oid::kCursor;
-    }
+    for (int index = 0; index < count; ++index) binary_ = binary_ && BinaryReader(PQftype(result, index));
     for (int index = 0; index < count; ++index) {
         const auto place = static_cast<std::size_t>(index);
         const Oid type = PQftype(result, index);
@@ -248,9 +240,12 @@ Status PgQuery::DescribeColumns(const PGresult* result) {
     return {};
 }
 
-// The tables are others than they were, or somebody has thrown the server's statements away.
+// The tables are others than they were, or somebody has thrown the server's statements away. With places behind it a list
+// of all columns that has got longer or shorter is none at all.
 bool PgQuery::IsStale(const Status& status) const {
-    return (status.Number() == errors::kSchemaChanged || status.Number() == 1003) && !connection_.Server().Broken();
+    const int number = status.Number();
+    return number == errors::kSchemaChanged || number == 1003 ||
+           (has_places_ && (number == errors::kInvalidStatement || number == errors::kInconsistentTypes));
 }
 
 Status PgQuery::PrepareAnew() {
@@ -355,18 +350,20 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         else if (delivers) batch = RunReturning(source, row, last, stop == run.last, *run.returned);
         else batch = RunBatch(source, row, last, stop == run.last);
         if (batch.refusal.Number() == errors::kCancelled) stop = row + batch.sent;
-        stop = std::min(stop, batch.stop.value_or(stop));
-        Status failure = std::move(batch.failure);
+        stop = batch.stop.value_or(stop);
+        Status failure = batch.failure;
         while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction) {
             batch = RunBatch(source, row, row + batch.done, false);
             if (batch.failure.Ok()) break;
             failure = batch.failure;
         }
-        if (batch.failure.Ok() && (failure.Ok() || batch.done > 0)) {
+        if (batch.failure.Ok()) {
             outcome.executed += batch.sent;
             outcome.affected += batch.affected;
-            if (batch.affected > 0) connection_.NoteChange();
-            if (batch.last_row) outcome.last_row = batch.last_row;
+            if (batch.affected > 0) {
+                connection_.NoteChange();
+                outcome.last_row = batch.last_row;    // none of rows that went whole
+            }
             row += batch.sent;
         }
         size = failure.Ok() ? std::min(2 * size, kLargestBatch) : std::max(size / 8, 1U);
@@ -417,7 +414,7 @@ PgQuery::Batch PgQuery::RunBatch(RowSource& source, std::uint32_t first, std::ui
 
 void PgQuery::ReadBatch(Batch& batch) noexcept {
     Wire& server = connection_.Server();
-    for (batch.done = 0; batch.done < batch.sent && batch.failure.Ok();) {
+    while (batch.done < batch.sent && batch.failure.Ok()) {
         const Result result = server.Next();
         if (server.Broken() && !result) return;
         if (!result) ++batch.done;

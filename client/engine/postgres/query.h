@@ -143,7 +143,6 @@ private:
     bool delivers_ = false;                // the sink has the row at hand
     RowAtHand held_;                       // or this one, where the sink itself has the rest read ahead
     bool binary_ = true;
-    bool has_cursors_ = false;
 
     State state_ = State::closed;
     PgConnection::Guard guard_ = PgConnection::Guard::none;

@@ -29,32 +29,19 @@ constexpr ElementRow kElements[] = {
 // The row of what a placeholder's values are written as; null: not in a binary form.
 const ElementRow* ElementOf(Oid type, Kind kind) {
     if (kind == Kind::null) return nullptr;
-    if (kind == Kind::text) type = IsTextType(type) ? oid::kText : 0;
-    else if (kind != Kind::timestamp && type != TypeOf(kind)) return nullptr;
+    if (IsTextType(type)) type = oid::kText;
+    else if (kind == Kind::text) return nullptr;
     const auto* found = std::find_if(std::begin(kElements), std::end(kElements),
                                      [type](const ElementRow& row) { return row.oid == type; });
     return found == std::end(kElements) ? nullptr : found;
 }
 
-void SkipBlanks(std::string_view& text) {
-    while (!text.empty() && (text.front() == ' ' || text.front() == '\n' || text.front() == '\t')) text.remove_prefix(1);
-}
-
-bool Take(std::string_view& text, std::string_view expected) {
-    SkipBlanks(text);
-    if (!text.starts_with(expected)) return false;
-    text.remove_prefix(expected.size());
-    return true;
-}
-
 // Whether "($1, $2, ...)" with so many placeholders is all there is.
 bool IsPlaceholdersAlone(std::string_view text, std::size_t count) {
-    for (std::size_t number = 1; number <= count; ++number) {
-        if (!Take(text, number == 1 ? "(" : ",") || !Take(text, "$" + std::to_string(number))) return false;
-    }
-    if (!Take(text, ")")) return false;
-    SkipBlanks(text);
-    return text.empty();
+    std::string pieces, expected;
+    for (const std::string_view piece : Split(text)) pieces += piece;
+    for (std::size_t number = 1; number <= count; ++number) expected += (number == 1 ? "($" : ",$") + std::to_string(number);
+    return pieces == expected + ')';
 }
 
 }  // namespace
@@ -74,7 +61,7 @@ bool PgQuery::PrepareWhole(std::uint32_t rows) {
 bool PgQuery::MakeWhole() {
     const std::vector<Oid>& types = bound_.Types();
     const std::size_t values = Lower(sql_).find("values");
-    if (!InsertsRows() || types.empty() || types.size() != kinds_.size()) return false;
+    if (!InsertsRows() || types.empty()) return false;
     if (!IsPlaceholdersAlone(std::string_view(sql_).substr(values + 6), types.size())) return false;
     std::string given, columns, arrays;
     for (std::size_t index = 0; index < types.size(); ++index) {
@@ -134,7 +121,7 @@ PgQuery::Batch PgQuery::RunWhole(RowSource& source, std::uint32_t first, std::ui
     std::size_t bytes = 0;
     arrays_.resize(bound_.Types().size());
     for (std::string& array : arrays_) array.assign(kHeader, '\0');
-    last = std::min(last, first + std::min(last - first, kMostRows));
+    last = first + std::min(last - first, kMostRows);
     for (std::uint32_t row = first; row < last && bytes < kMostBytes; ++row) {
         batch.refusal = Load(source, row);
         if (batch.refusal.Ok() && server.Asked()) batch.refusal = PgConnection::Stopped();
@@ -160,7 +147,6 @@ PgQuery::Batch PgQuery::RunWhole(RowSource& source, std::uint32_t first, std::ui
     Status rest = server.Drain();
     if (batch.failure.Ok()) batch.failure = std::move(rest);
     batch.failure = connection_.Settle(guard, std::move(batch.failure));
-    batch.done = 0;
     return batch;
 }
 

@@ -20,20 +20,24 @@ struct Given {
     std::size_t parameter;    // from 0; kNotBound: it is empty_blob()
 };
 
-// Placeholders of texts and bytes, and empty_blob(). `placeholders` counts all, as far as they are numbered.
-std::vector<Given> BytesGiven(std::string_view sql, const std::vector<Kind>& kinds, std::size_t& placeholders) {
+// The kind of a placeholder's values, and its number from 0; null of what stands within quotes that are not read here.
+Kind KindOf(std::string_view placeholder, const std::vector<Kind>& kinds, std::size_t& number) {
+    number = std::strtoul(std::string(placeholder.substr(1)).c_str(), nullptr, 10) - 1;
+    return number < kinds.size() ? kinds[number] : Kind::null;
+}
+
+// Placeholders of texts and bytes, and empty_blob().
+std::vector<Given> BytesGiven(std::string_view sql, const std::vector<Kind>& kinds) {
     std::vector<Given> given;
     const PieceList pieces = Split(sql);
-    placeholders = kinds.size();
     for (std::size_t at = 0; at < pieces.size(); ++at) {
         const std::string_view piece = pieces[at];
         if (piece.starts_with('$')) {
-            const auto number = static_cast<std::size_t>(std::strtoul(std::string(piece.substr(1)).c_str(), nullptr, 10));
-            placeholders = std::max(placeholders, number);
-            const Kind kind = number > 0 && number <= kinds.size() ? kinds[number - 1] : Kind::null;
-            if (kind == Kind::text || kind == Kind::bytes) given.push_back({piece, number - 1});
+            std::size_t number = 0;
+            const Kind kind = KindOf(piece, kinds, number);
+            if (kind == Kind::text || kind == Kind::bytes) given.push_back({piece, number});
         } else if (IsWord(piece, "empty_blob") && at + 2 < pieces.size() && pieces[at + 1] == "(" && pieces[at + 2] == ")" &&
-                   (at == 0 || pieces[at - 1] != ".")) {
+                   pieces[at - 1] != ".") {
             const std::string_view end = pieces[at + 2];
             given.push_back({{piece.data(), static_cast<std::size_t>(end.data() + 1 - piece.data())}, kNotBound});
         }
@@ -65,10 +69,10 @@ std::vector<std::size_t> StoredAlone(std::string_view sql, const std::vector<Kin
         if (piece == ")" && open.size() > 1) open.pop_back();
         if (!piece.starts_with('$') || !open.back()) continue;
         const bool begins = before == "(" || before == "," || before == "=";
-        const bool ends = next.empty() || next == ")" || next == "," || next == ";" || IsName(next);
-        const auto number = static_cast<std::size_t>(std::strtoul(std::string(piece.substr(1)).c_str(), nullptr, 10));
-        const Kind kind = number > 0 && number <= kinds.size() ? kinds[number - 1] : Kind::null;
-        if (begins && ends && (kind == Kind::bytes || kind == Kind::row_id)) alone.push_back(number - 1);
+        const bool ends = next.empty() || next == ")" || next == "," || IsName(next);
+        std::size_t number = 0;
+        const Kind kind = KindOf(piece, kinds, number);
+        if (begins && ends && (kind == Kind::bytes || kind == Kind::row_id)) alone.push_back(number);
     }
     return alone;
 }
@@ -105,7 +109,7 @@ Status PgQuery::PrepareForTexts(std::vector<Oid> types, std::uint32_t& error_off
 // The server reads a text for such a column as the number of an object.
 bool PgQuery::GivesTextsToObjects() const {
     const std::vector<Oid>& types = bound_.Types();
-    for (std::size_t index = 0; index < std::min(types.size(), kinds_.size()); ++index) {
+    for (std::size_t index = 0; index < kinds_.size(); ++index) {
         if (kinds_[index] == Kind::text && connection_.IsObjectType(types[index])) return true;
     }
     return false;
@@ -120,8 +124,8 @@ Status PgQuery::PrepareForObjects(Status status, std::uint32_t& error_offset) {
 }
 
 Status PgQuery::FindObjects(bool& found) {
-    std::size_t placeholders = 0;
-    const std::vector<Given> given = BytesGiven(sql_, kinds_, placeholders);
+    std::size_t placeholders = kinds_.size();
+    const std::vector<Given> given = BytesGiven(sql_, kinds_);
     if (given.empty()) return {};
     std::vector<Oid> types = DeclaredTypes();
     std::vector<std::string> others;
@@ -148,7 +152,7 @@ Status PgQuery::FindObjects(bool& found) {
         found = true;
         others[index] = NewObject(is_bound ? others[index] : "''::bytea");
         if (!is_bound) continue;
-        makes_object_.resize(placeholders);
+        makes_object_.resize(kinds_.size());
         makes_object_[given[index].parameter] = true;
     }
     text_ = WithOthers(sql_, given, others);

@@ -18,19 +18,18 @@ Status PgQuery::Open(RowSource& source, const QueryRun& run) {
     Close();
     if (connection_.Server().Asked()) return PgConnection::Stopped();
     if (Status status = connection_.Enter(effect_); !status.Ok()) return status;
-    Status status = Load(source, run.row);
-    if (status.Ok()) status = Start(run);
-    if (Renews(status)) {
+    Status status;
+    for (int runs = 0; runs == 0 || (runs == 1 && Renews(status)); ++runs) {
         status = Load(source, run.row);
         if (status.Ok()) status = Start(run);
     }
     return status;
 }
 
-// Rows are locked as they are sent, and a cursor that is a value ends with the transaction.
+// Rows are locked as they are sent.
 Status PgQuery::Start(const QueryRun& run) {
     Wire& server = connection_.Server();
-    guard_ = connection_.SendGuard(effect_ == Effect::locks || effect_ == Effect::changes || has_cursors_);
+    guard_ = connection_.SendGuard(effect_ == Effect::locks);
     server.SendExecute(name_.c_str(), bound_.Values(), binary_);
     connection_.SendRelease(guard_);
     const Wire::Heeding heeding(server);
@@ -225,7 +224,6 @@ Status PgQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
     const Wire::Heeding heeding(connection_.Server());
     Status status = CheckOpen();
     if (!status.Ok()) return status;
-    if (!scrollable_) return Refused(errors::kFetchOutOfSequence);
     status = Keep(position);
     if (!status.Ok()) return Ended(std::move(status));
     next_ = std::min(position, store_.Size());
@@ -240,7 +238,6 @@ Status PgQuery::Count(std::uint64_t& rows) {
     const Wire::Heeding heeding(connection_.Server());
     Status status = CheckOpen();
     if (!status.Ok()) return status;
-    if (!scrollable_) return Refused(errors::kFetchOutOfSequence);
     status = Keep(std::numeric_limits<std::uint64_t>::max());
     if (!status.Ok()) return Ended(std::move(status));
     rows = store_.Size();
@@ -251,7 +248,6 @@ void PgQuery::Close() noexcept {
     if (state_ == State::closed) return;
     if (connection_.Streams(this)) Leave();
     store_.Clear();
-    row_.reset();
     state_ = State::closed;
     end_ = {};
     next_ = 0;
@@ -319,7 +315,7 @@ Status PgQuery::FillLobs(const PGresult* result, int row) {
         if (!is_object && !ReadField(result, row, field, oid::kInt8, room, length)) return Refused(errors::kInternalError);
         view.column = &lobs_[index].column;
         view.length = static_cast<std::uint64_t>(length.integer);
-        view.is_whole = !is_object && value.kind != Kind::null && value.length == view.length;
+        view.is_whole = !is_object && value.kind != Kind::null;
         std::string& bytes = at_hand_.lobs[index];
         bytes.assign(reinterpret_cast<const char*>(&view), sizeof view);
         if (view.is_whole) bytes.append(value.Text());

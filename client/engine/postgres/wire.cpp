@@ -25,12 +25,7 @@ constexpr std::int64_t kLong = std::int64_t{16} << 20;    // bytes
 constexpr int kNoticeNumber = 20000;    // what the server, or code in it, tells in its own words
 constexpr auto kForever = Clock::time_point::max();
 
-bool IsError(const PGresult* result) {
-    const ExecStatusType status = PQresultStatus(result);
-    return status == PGRES_FATAL_ERROR || status == PGRES_BAD_RESPONSE;
-}
-
-// When a connect that begins now is given up, by the parameter of that name; libpq takes no less than 2 seconds.
+// When a connect that begins now is given up, by the parameter of that name.
 Clock::time_point ConnectEnd(PGconn* connection) {
     PQconninfoOption* const options = PQconninfo(connection);
     int seconds = 0;
@@ -38,7 +33,7 @@ Clock::time_point ConnectEnd(PGconn* connection) {
         if (std::strcmp(option->keyword, "connect_timeout") == 0 && option->val) seconds = std::atoi(option->val);
     }
     PQconninfoFree(options);
-    return seconds > 0 ? Clock::now() + std::chrono::seconds(std::max(seconds, 2)) : kForever;
+    return seconds > 0 ? Clock::now() + std::chrono::seconds(seconds) : kForever;
 }
 
 int Milliseconds(Clock::time_point end) {
@@ -254,7 +249,7 @@ Status Wire::Pass(int commands) noexcept {
     while (commands > 0) {
         const Result result = Next();
         if (!result) --commands;
-        else if (IsError(result.get()) && first.Ok()) first = Answer(result.get());
+        else if (IsFailure(result.get()) && first.Ok()) first = Answer(result.get());
     }
     return first;
 }
@@ -266,7 +261,7 @@ Status Wire::Drain(Result* last) noexcept {
         Result result = Next();
         if (!result) continue;
         const ExecStatusType status = PQresultStatus(result.get());
-        if (IsError(result.get())) {
+        if (IsFailure(result.get())) {
             if (first.Ok()) first = Answer(result.get());
         } else if (last && status != PGRES_PIPELINE_SYNC && status != PGRES_PIPELINE_ABORTED) {
             *last = std::move(result);
@@ -293,7 +288,7 @@ Status Wire::Run(const char* sql, Result* last) noexcept {
     Sent(PQsendQuery(connection_, sql));
     Status first;
     for (Result result; (result = Next());) {
-        if (!IsError(result.get())) {
+        if (!IsFailure(result.get())) {
             if (last) *last = std::move(result);
         } else if (first.Ok()) {
             first = Answer(result.get());
@@ -308,7 +303,7 @@ Status Wire::Run(const char* sql, Result* last) noexcept {
 Status Wire::RunScript(const char* commands) noexcept {
     if (broken_ || !PQexitPipelineMode(connection_)) return Lost();
     const Result result(PQexec(connection_, commands));
-    Status status = result && PQresultStatus(result.get()) != PGRES_FATAL_ERROR ? Status() : Answer(result.get());
+    Status status = IsFailure(result.get()) ? Answer(result.get()) : Status();
     if (status.Failed() && Transaction() != PQTRANS_IDLE) Result(PQexec(connection_, "rollback"));
     Status settled = Settle();
     return status.Ok() ? settled : status;
