@@ -241,7 +241,9 @@ private:
         for (std::size_t index = first; index + 1 < last; ++index) {
             const Token& next = tokens_[index + 1];
             if (tokens_[index].Is("for") && next.Is("update")) return true;
-            const Leading* row = tokens_[index].Is("(") && !next.Is("replace") ? FindLeading(next) : nullptr;
+            const Token& behind = At(tokens_, index + 2);    // what no column or function of that name has there
+            const bool begins = behind.Is("into") || behind.Is("from") || next.Is("update");
+            const Leading* row = begins && tokens_[index].Is("(") ? FindLeading(next) : nullptr;
             if (row && row->run == Run::change) return true;
         }
         return false;
