@@ -14,7 +14,7 @@ namespace date {
 
 // Gives `value`, whose date and time are local, the zone that a text names: "+hh:mm", "-hh:mm" or a region. In a region
 // the offset is the one in force at that local time; of an hour that comes twice the first is meant, one that is
-// skipped counts with the offset before it. Empty: the zone of the process.
+// skipped counts with the offset before it. A time without a date has the offset of today. Empty: the zone of the process.
 Errno SetZone(std::string_view zone, DateTime* value) noexcept;
 
 // Gives it an offset, from 12 hours west to 14 hours east.
