@@ -166,7 +166,7 @@ Interval Negative(const Interval& value) noexcept { return {value.span, -value.w
 
 Errno RoundFraction(const Interval& value, int digits, Interval* result) noexcept {
     std::int64_t unit = kSecond;
-    for (int place = 0; place < digits; ++place) unit /= 10;
+    for (int place = 0; place < digits && unit > 1; ++place) unit /= 10;    // a column may be declared with more
     const std::int64_t half = value.nanosecond < 0 ? -(unit / 2) : unit / 2;
     if (value.span == Span::year_month) return Take(value, result);
     return TakeSeconds(value.whole, (value.nanosecond + half) / unit * unit, result);
