@@ -111,6 +111,7 @@ int ReadLocator(const Located& located, Workspace& workspace, Datum& value) {
     if (length <= engine::kHeldWhole) return ReadFrom(*located.lob, kWholeLob, workspace.content, value, length);
     workspace.object = located.lob;
     value.kind = Kind::lob;
+    value.length = 0;
     value.data = workspace.object.get();
     return 0;
 }
