@@ -222,8 +222,6 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
         EXPECT_EQ(size, 12u);
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneName(env_, err_, plain, name, &size)), 1878);
     }
-    sb1 hour = 0, minute = 0;
-    EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, plain, &hour, &minute)), 1878);
     auto* date = NewDescriptor<OCIDateTime>(OCI_DTYPE_DATE);
     EXPECT_EQ(Answer(OCIDateTimeConstruct(env_, err_, date, 2024, 7, 16, 13, 14, 15, 0, nullptr, 0)), 0);
     EXPECT_EQ(Shown(date, "DD HH24:MI:SS"), "16 00:00:00");
@@ -239,6 +237,7 @@ TEST_F(IntervalCalls, TextsAndZonesOfMoments) {
 // Which parts each type has, and what it drops.
 TEST_F(IntervalCalls, TypesOfMoments) {
     auto* tokyo = Moment("2024-07-15 10:20:30.5 Asia/Tokyo");
+    auto* out = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS);
     const struct { ub4 type; const char *made, *converted; sb4 date, time, compared, zone, moved; } cases[] = {
         {OCI_DTYPE_DATE, "16-JUL-24", "15-JUL-24", 0, 1878, 0, 1878, 0},
         {OCI_DTYPE_TIME, "01.14.15.000000 PM", "10.20.30.500000 AM", 1878, 0, 1870, 1878, 1878},
@@ -267,10 +266,8 @@ TEST_F(IntervalCalls, TypesOfMoments) {
         EXPECT_EQ(Answer(OCIDateTimeCompare(env_, err_, value, tokyo, &order)), c.compared);
         EXPECT_EQ(Answer(OCIDateTimeGetTimeZoneOffset(env_, err_, value, &hour, &minute)), c.zone);
         if (c.type == OCI_DTYPE_TIME_TZ) { EXPECT_EQ(hour * 60 + minute, 540) << "not that of the year 0"; }
-        for (OCIDateTime* left : {value, tokyo}) {
-            EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, left, left == value ? tokyo : value,
-                                                 NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_DS))), c.moved);
-        }
+        EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, value, tokyo, out)), c.moved);
+        EXPECT_EQ(Answer(OCIDateTimeSubtract(env_, err_, tokyo, value, out)), c.moved);
         EXPECT_EQ(Answer(OCIDateTimeIntervalAdd(env_, err_, value, Read("1"), value)), c.moved);
     }
 }
