@@ -133,7 +133,7 @@ std::string TagOf(const Session* session) {
     const std::shared_ptr<Link> link = session ? session->ShareLink() : nullptr;
     if (!link) return {};
     const SerialLock lock(link->Serial());
-    return !link->Closed() && link->Place() ? static_cast<const PoolPlace*>(link->Place())->Tag() : std::string();
+    return link->Place() ? static_cast<const PoolPlace*>(link->Place())->Tag() : std::string();
 }
 
 // The tag as the application reads it; whether it is the one that was wished for.

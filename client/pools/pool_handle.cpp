@@ -142,7 +142,7 @@ Status PoolHandle::CreatePool(Request request) {
         std::string name;
         bool done = false;
         ~Creation() {
-            if (!done && !name.empty()) Forget(name);
+            if (!done) Forget(name);
             if (!done && pool) pool->Close();
             const std::lock_guard lock(handle.mutex_);
             handle.creating_ = false;

@@ -198,6 +198,8 @@ TEST_F(NlsCalls, TextsOfValuesThatAreNone) {
         Answer(OCIFileExists(env_, err_, const_cast<OraText*>(one), const_cast<OraText*>(bad), &exists)),
         Answer(OCIIntervalFromText(env_, err_, bad, 1, interval))};
     for (std::size_t index = 0; index < std::size(answers); ++index) EXPECT_EQ(answers[index], 24501) << index;
+    for (const ub4 room : {2U, 0x7FFFFFFFU})
+        EXPECT_EQ(Answer(OCINumberToText(err_, &number, nine, 1, nullptr, 0, &(size = room), area)), 0) << room;
 }
 
 }  // namespace
