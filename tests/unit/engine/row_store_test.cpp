@@ -1,4 +1,4 @@
-// Rows and bytes that are kept: any order of reading, and what is left when memory or the disk fails.
+// Rows and bytes that are kept, and what is left when memory or the disk fails.
 #include <sys/resource.h>
 
 #include <csignal>
@@ -30,28 +30,6 @@ TEST(RowStore, BlocksThatAreJustFull) {
             for (std::size_t row = 0; row < before; ++row) ASSERT_EQ(At(store, row, 1), "7;");
             ASSERT_TRUE(At(store, before, 1) == text + ';') << before << " rows before one of " << length;
         }
-    }
-}
-
-// Sizes about those of blocks; some 100 MB, so that most lie in the file.
-TEST(RowStore, ReadsInAnyOrder) {
-    engine::RowStore store;
-    constexpr std::uint64_t kRows = 4000;
-    const auto size = [](std::uint64_t row) { return row % 1000 == 999 ? 1000000u : static_cast<unsigned>(row * 37 % 50000); };
-    std::string text(1000000, 'x');
-    for (std::uint64_t row = 0; row < kRows; ++row) {
-        const Datum values[] = {Integer(static_cast<std::int64_t>(row)), Text(std::string_view(text).substr(0, size(row)))};
-        ASSERT_TRUE(store.Add(values).Ok());
-    }
-    ASSERT_EQ(store.Size(), kRows);
-    std::uint64_t index = 7;
-    for (int turn = 0; turn < 6000; ++turn) {
-        index = turn < 3000 ? index + 1 : index * 2654435761u + 1;
-        Datum values[2];
-        ASSERT_TRUE(store.Read(index % kRows, values).Ok());
-        ASSERT_EQ(values[0].integer, static_cast<std::int64_t>(index % kRows));
-        ASSERT_EQ(values[1].length, size(index % kRows));
-        ASSERT_EQ(values[1].Text().find_first_not_of('x'), std::string_view::npos);
     }
 }
 

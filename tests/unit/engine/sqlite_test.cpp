@@ -1,5 +1,5 @@
 // What is the SQLite engine's own: numbers and declared types in a file, descriptions, SQL functions, errors by number,
-// the accounts' table, files that cannot be written, databases in memory.
+// the accounts' table, files that cannot be written.
 #include <sqlite3.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
@@ -65,30 +65,6 @@ TEST_F(Sqlite, AccountsAreNobodysBusiness) {
     EXPECT_TRUE(ByHand("select password from kelp_accounts").starts_with("$y$"));
 }
 
-// The tables of a database in memory stay for the next session, what was the former one's alone does not.
-TEST_F(Sqlite, SessionsOfADatabaseInMemoryShareItsTablesAlone) {
-    connection_.reset();
-    ASSERT_TRUE(engine::Open(":memory:", database_).Ok());
-    connection_ = Connect();
-    MustRun("create table kept(n integer primary key, p integer references kept(n))",
-            "create temp table mine(n integer)", "create temp view seen as select * from kept",
-            "create temp trigger g after insert on kept begin delete from kept; end",
-            "attach '" + folder_ + "/test.db' as other");
-    EXPECT_EQ(Query("pragma query_only = 1"), "");
-    EXPECT_EQ(Query("pragma foreign_keys = 0"), "");
-    connection_.reset();
-    connection_ = Connect();
-    EXPECT_EQ(Run("insert into kept values(1, 2)"), 2291) << "references are checked again";
-    EXPECT_EQ(Run("insert into kept values(1, 1)"), 0);
-    EXPECT_EQ(Query("select n from kept"), "1;") << "no trigger of the former session's";
-    EXPECT_EQ(Query("select * from mine"), "error 942");
-    EXPECT_EQ(Query("select * from seen"), "error 942");
-    EXPECT_EQ(Query("select name from pragma_database_list where name <> 'temp'"), "main;");
-    connection_.reset();
-    connection_ = Connect();
-    EXPECT_EQ(Query("select * from kept"), "") << "rolled back at the end";
-}
-
 TEST_F(Sqlite, BrokenDatabasesHaveTheirNumbers) {
     MustCommit("create table t(n integer, v text)", "insert into t values(1, 'kept')");
     std::unique_ptr<engine::Database> none;
@@ -150,20 +126,6 @@ TEST_F(Sqlite, FileThatCannotBeWrittenIsRead) {
     EXPECT_EQ(AsNobody(look), 0) << "the folder";
     std::ofstream(file + "-wal") << "what a writer has left";
     EXPECT_EQ(AsNobody(look), geteuid() == 0 ? 1 : 0) << "what lies in the log cannot be seen";
-}
-
-TEST_F(Sqlite, OnlyWhoOwnsTheFileNeedsNoPassword) {
-    ASSERT_EQ(LogOn("ann", "secret"), 0);
-    connection_ = Connect();
-    connection_.reset();
-    database_.reset();
-    const std::string file = folder_ + "/test.db";
-    ASSERT_EQ(chmod(folder_.c_str(), 0555), 0);
-    const auto look = [&] {
-        if (engine::Open(file, database_).Failed()) return 1;
-        return Answer(database_->Connect({"", "", true}, stop_, connection_)) == 1017 ? 0 : 2;
-    };
-    EXPECT_EQ(geteuid() == 0 ? AsNobody(look) : 0, 0) << "needs another user, as root may become";
 }
 
 // Pages that lie in an unwritable file may be of two times once somebody else has a log beside it, or has written it: no

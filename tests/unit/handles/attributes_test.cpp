@@ -184,24 +184,6 @@ TEST_F(AttributesTest, EveryNumberOverEveryKind) {
     }
 }
 
-// Of dates and times numbers 16 and 17 mean something else, in one byte.
-TEST_F(AttributesTest, DigitsOfDatetimes) {
-    OCIDefine* define = nullptr;
-    static OCIDateTime* moment = nullptr;
-    ASSERT_EQ(Run(svc_, stmt_, err_, "select b from t", 0), 0);
-    ub1 digits[2] = {2, 77};
-    for (const ub2 type : {SQLT_TIMESTAMP, SQLT_INTERVAL_YM, SQLT_INTERVAL_DS}) {
-        ASSERT_EQ(Answer(OCIDefineByPos(stmt_, &define, err_, 1, &moment, 8, type, nullptr, nullptr, nullptr, OCI_DEFAULT)), 0);
-        ++digits[0];
-        for (const ub4 attribute : {OCI_ATTR_FSPRECISION, OCI_ATTR_LFPRECISION}) {
-            EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, attribute, digits), 0);
-            EXPECT_EQ((Attribute<std::pair<ub1, ub1>>(define, OCI_HTYPE_DEFINE, attribute)), std::pair(digits[0], ub1{0}));
-        }
-    }
-    digits[0] = 10;
-    EXPECT_EQ(Set(define, OCI_HTYPE_DEFINE, OCI_ATTR_FSPRECISION, digits), 24328);
-}
-
 static_assert(sizeof(utext) == 2 && UB4MAXVAL + 1 == UB4MINVAL && SB4MINVAL < SB4MAXVAL && SQLT_AFV == 97);
 static_assert(OCI_TYPECODE_BFLOAT == 100 && OCI_TYPECODE_BDOUBLE == 101 && OCI_FO_REAUTH == 4 && OCI_FO_TXNAL == 8);
 
@@ -227,27 +209,6 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     dvoid* const database = Described(OnServer() ? ann_.substr(4).c_str() : "memory", OCI_PTYPE_DATABASE);
     EXPECT_EQ(Attribute<ub1>(database, OCI_DTYPE_PARAM, OCI_ATTR_NOWAIT_SUPPORT),
               OnServer() ? OCI_NW_SUPPORTED : OCI_NW_UNSUPPORTED);
-}
-
-// Converted texts stay where they are while others of the handle are asked for.
-TEST(Attributes, Utf16TextsStay) {
-    OCIEnv* env = NewEnvironment(OCI_UTF16);
-    auto* err = NewHandle<OCIError>(env, OCI_HTYPE_ERROR);
-    auto* session = NewHandle<OCISession>(env, OCI_HTYPE_SESSION);
-    const ub4 attributes[] = {OCI_ATTR_USERNAME, OCI_ATTR_EDITION, OCI_ATTR_CONNECTION_CLASS, OCI_ATTR_CURRENT_SCHEMA};
-    const char16_t* names[4] = {};
-    for (int index = 0; index < 4; ++index) {
-        const char16_t name[] = {static_cast<char16_t>(u'a' + index), u'\u0100', u'é', 0, u'x'};    // ends at the zero
-        OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char16_t*>(name), sizeof name, attributes[index], err);
-        EXPECT_EQ(OCIAttrGet(session, OCI_HTYPE_SESSION, &names[index], nullptr, attributes[index], err), OCI_SUCCESS);
-    }
-    for (int index = 0; index < 4; ++index) {
-        EXPECT_TRUE(std::u16string_view(names[index] + 1) == u"\u0100é" && names[index][0] == u'a' + index) << index;
-    }
-    char16_t half = 0xD83D;
-    EXPECT_EQ(OCIAttrSet(session, OCI_HTYPE_SESSION, &half, 2, OCI_ATTR_USERNAME, err), OCI_ERROR);
-    EXPECT_EQ(FirstCode(err), 24501);
-    OCIHandleFree(env, OCI_HTYPE_ENV);
 }
 
 }  // namespace

@@ -1,5 +1,4 @@
-// The calls on environments, handles, errors, attributes and sessions, as an application makes them: with good
-// arguments, with null and foreign pointers, with memory that runs out, in UTF-16, from several threads.
+// Calls with pointers that are no handles, with passwords that are too long, and with a handle where another one was.
 #include <array>
 #include <cstdlib>
 #include <map>
@@ -18,31 +17,6 @@ protected:
         Folder();
     }
 };
-
-TEST_F(CallsTest, EveryTypeIsMadeAndFreedOnce) {
-    const struct {
-        sword (*alloc)(const dvoid*, dvoid**, ub4, size_t, dvoid**);
-        sword (*free)(dvoid*, ub4);
-        sword (*other_free)(dvoid*, ub4);
-        ub4 first, last;
-        sb4 refused;
-    } kinds[] = {{OCIHandleAlloc, OCIHandleFree, OCIDescriptorFree, 1, 29, 24316},
-                 {OCIDescriptorAlloc, OCIDescriptorFree, OCIHandleFree, 50, 81, 24332}};
-    for (const auto& kind : kinds) {
-        for (ub4 type = 0; type < 100; ++type) {
-            dvoid* made = &type;
-            const bool known = type >= kind.first && type <= kind.last;
-            ASSERT_EQ(kind.alloc(env_, &made, type, 0, nullptr), known ? OCI_SUCCESS : OCI_ERROR) << type;
-            EXPECT_EQ(made == &type, !known) << "the output is written on success only";
-            EXPECT_TRUE(known || FirstCode(env_, OCI_HTYPE_ENV) == kind.refused) << type;
-            if (!known) continue;
-            EXPECT_EQ(kind.free(made, type == kind.last ? kind.first : type + 1), OCI_INVALID_HANDLE) << "another " << type;
-            EXPECT_EQ(kind.other_free(made, type), OCI_INVALID_HANDLE) << type;
-            EXPECT_EQ(kind.free(made, type), OCI_SUCCESS) << type;
-            EXPECT_EQ(kind.free(made, type), OCI_INVALID_HANDLE) << "freed twice " << type;
-        }
-    }
-}
 
 // Whatever is no living handle of the kind: null, text, a handle of another kind, one that is freed.
 TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
@@ -107,31 +81,6 @@ TEST_F(CallsTest, PasswordsThatAreTooLong) {
     EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
 }
 
-TEST_F(CallsTest, InitializeServesEnvInit) {
-    OwnMemory memory;
-    ASSERT_EQ(
-        OCIInitialize(OCI_UTF16 | OCI_OBJECT, &memory, OwnMemory::Allocate, OwnMemory::Reallocate, OwnMemory::Free), 0);
-    OCIEnv* env = nullptr;
-    dvoid *handle = nullptr, *extra = nullptr;
-    ASSERT_EQ(OCIEnvInit(&env, OCI_DEFAULT, 9, &extra), OCI_SUCCESS);
-    EXPECT_GT(memory.out, 0);
-    EXPECT_TRUE(extra && Attribute<dvoid*>(env, OCI_HTYPE_ENV, OCI_ATTR_USER_MEMORY) == extra);
-    ASSERT_EQ(OCIHandleAlloc(env, &handle, OCI_HTYPE_STMT, 9, &extra), OCI_SUCCESS);
-    EXPECT_EQ(std::string(static_cast<char*>(extra), 9), std::string(9, '\0'));
-    EXPECT_EQ(Attribute<dvoid*>(handle, OCI_HTYPE_STMT, OCI_ATTR_USER_MEMORY), extra);
-    EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 1);
-    EXPECT_EQ(Attribute<ub4>(env, OCI_HTYPE_ENV, OCI_ATTR_OBJECT), 1u);
-    EXPECT_EQ(Attribute<ub2>(env, OCI_HTYPE_ENV, OCI_ATTR_CHARSET_ID), 1000);
-    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-    EXPECT_EQ(memory.out, 0);
-    MUST(OCITerminate(OCI_DEFAULT), OCIEnvInit(&env, OCI_DEFAULT, 0, nullptr));
-    EXPECT_EQ(Attribute<ub1>(env, OCI_HTYPE_ENV, OCI_ATTR_ENV_UTF16), 0) << "forgotten";
-    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-    ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, OwnMemory::Allocate, nullptr, nullptr, 0, nullptr), OCI_SUCCESS);
-    EXPECT_EQ(memory.out, 0) << "one function alone is none";
-    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), OCI_SUCCESS);
-}
-
 // Gives freed blocks out again, the last one first.
 struct SameMemory {
     std::map<size_t, std::vector<dvoid*>> freed;
@@ -153,5 +102,26 @@ struct SameMemory {
         self.freed[self.sizes[block]].push_back(block);
     }
 };
+
+// What a context was put together from is not what lies there later.
+TEST_F(CallsTest, AHandleWhereAnotherOneWas) {
+    SameMemory memory;
+    OCIEnv* env = nullptr;
+    ASSERT_EQ(OCIEnvCreate(&env, 0, &memory, SameMemory::Allocate, SameMemory::Reallocate, SameMemory::Free, 0, nullptr), 0);
+    dvoid* service = nullptr;
+    ASSERT_EQ(OCIHandleAlloc(env, &service, OCI_HTYPE_SVCCTX, 0, nullptr), 0);
+    constexpr std::array<std::pair<ub4, ub4>, 3> parts{{{OCI_HTYPE_SERVER, OCI_ATTR_SERVER}, {OCI_HTYPE_SESSION, OCI_ATTR_SESSION},
+                                                        {OCI_HTYPE_TRANS, OCI_ATTR_TRANS}}};
+    for (const auto& [type, attribute] : parts) {
+        dvoid *former = nullptr, *next = nullptr;
+        ASSERT_EQ(OCIHandleAlloc(env, &former, type, 0, nullptr), 0);
+        ASSERT_EQ(OCIAttrSet(service, OCI_HTYPE_SVCCTX, former, 0, attribute, err_), 0);
+        EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), former);
+        ASSERT_EQ(OCIHandleFree(former, type) + OCIHandleAlloc(env, &next, type, 0, nullptr), 0);
+        ASSERT_EQ(next, former) << "else this test tests nothing";
+        EXPECT_EQ(Attribute<dvoid*>(service, OCI_HTYPE_SVCCTX, attribute), nullptr) << type;
+    }
+    ASSERT_EQ(OCIHandleFree(env, OCI_HTYPE_ENV), 0);
+}
 
 }  // namespace

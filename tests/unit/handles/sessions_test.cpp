@@ -58,20 +58,6 @@ protected:
     }
 };
 
-// What fails outside of a transaction leaves none behind: nobody has to wait for it.
-TEST_F(Sessions, FailureOutsideATransactionHoldsNoLock) {
-    OCISvcCtx *first = nullptr, *second = nullptr;
-    MUST(LogOn(&first, "work"), Run(first, "create table t(a number unique)"), LogOn(&second, "work"));
-    const struct { const char* sql; sb4 answer; } cases[] = {
-        {"rollback to nowhere", 1086}, {"release nowhere", 1086}, {"insert into t values('x')", 1722},
-        {"begin insert into t values(1); insert into t values(1); end;", 1}, {"begin rollback to nowhere; end;", 1086}};
-    for (const auto& c : cases) {
-        EXPECT_EQ(Run(first, c.sql), c.answer) << c.sql;
-        EXPECT_EQ(Run(second, "insert into t values(9)"), 0) << c.sql;
-        EXPECT_EQ(Run(second, "rollback"), 0);
-    }
-}
-
 TEST_F(Sessions, AServerIsBusyWhileACallRuns) {
     OCISvcCtx* svc = nullptr;
     MUST(LogOn(&svc, "here"), Run(svc, "create table t(n number)"));

@@ -146,27 +146,6 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
     EXPECT_EQ(oerhms(nullptr, 942, message.data(), 0), 1009);
 }
 
-TEST_F(LegacyCalls, LocksAreWaitedFor) {
-    const std::filesystem::path file =
-        std::filesystem::temp_directory_path() / ("legacy_calls_" + std::to_string(getpid()));
-    Login holding, waiting;
-    if (!server) database = file;
-    for (Login* login : {&holding, &waiting}) MUST(login->LogOn(user, database), login->Open());
-    ASSERT_EQ(server ? 0 : waiting.Run("create table t (n integer, c varchar2(10))"), 0);
-    MUST(waiting.Run("insert into t values (1, 'a')"), ocom(&waiting.lda), holding.Run("update t set c = 'b'"));
-    MUST(oopt(&waiting.cda, 2, 4));
-    EXPECT_EQ(waiting.Run("update t set c = 'c' where n = 1"), 54) << "not where that is not wished for, and there alone";
-    MUST(oopt(&waiting.cda, 2, 0));
-    std::thread releasing([&] {
-        std::this_thread::sleep_for(200ms);
-        EXPECT_EQ(ocom(&holding.lda), 0);
-    });
-    EXPECT_EQ(waiting.Run("update t set c = 'c' where n = 1"), 0);
-    releasing.join();
-    SHOULD(ocom(&waiting.lda), ologof(&holding.lda), ologof(&waiting.lda));
-    for (const char* ending : {"", "-wal", "-shm", "-journal"}) std::filesystem::remove(file.string() + ending);
-}
-
 // A context that goes while its session is lent waits for what is left unfinished.
 TEST_F(LegacyCalls, AContextThatLendsItsSessionGoes) {
     OCIEnv* env = nullptr;

@@ -102,26 +102,6 @@ TEST_F(NullArguments, OfIntervals) {
              {".hhnn", Nulls(OCIIntervalCheck, env_, err_, days, &flags_)}});
 }
 
-TEST_F(NullArguments, OfObjects) {
-    OCIFileObject* file = nullptr;
-    OCIThreadMutex* mutex = nullptr;
-    OCIThreadId* id = nullptr;
-    OCIString* string = nullptr;
-    OraText text[] = "x";
-    ub2 length = 1;
-    boolean same = FALSE;
-    dvoid* array = nullptr;
-    auto* branch = New<OCITrans>(OCI_HTYPE_TRANS);
-    EXPECT_EQ(OCIFileInit(env_, err_) + OCIThreadInit(env_, err_) + OCIThreadMutexInit(env_, err_, &mutex) +
-                  OCIThreadIdInit(env_, err_, &id), 0);
-    Compare({{".hh30150..", Nulls(OCIFileOpen, env_, err_, &file, text, text, ub4{1}, ub4{0}, ub4{OCI_FILE_STDIN})},
-             {".hhn", Nulls(OCIThreadMutexDestroy, env_, err_, &mutex)}, {".hhnnn", Nulls(OCIThreadIdSame, env_, err_, id, id, &same)},
-             {".hhn", Nulls(OCIStringResize, env_, err_, 0, &string)},
-             {"1410hnnh", Nulls(OCIRowidToChar, NewDescriptor<OCIRowid>(OCI_DTYPE_ROWID), text_, &length, err_)},
-             {"nhnn", Nulls(OCIArrayDescriptorAlloc, env_, &array, OCI_DTYPE_LOB, 0, 0, nullptr)},
-             {"3114hhh", Nulls(OCITransMultiPrepare, New<OCISvcCtx>(OCI_HTYPE_SVCCTX), 1, &branch, &err_)}});
-}
-
 TEST_F(NullArguments, OfSets) {
     ub2 units[8] = {}, id = 0;
     sb4 value = 0;

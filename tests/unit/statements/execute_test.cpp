@@ -1,4 +1,4 @@
-// Executing and fetching: rows that fail, index-table arguments at their limits, what comes back into binds, lengths.
+// Executing and fetching: rows that fail, index-table arguments at their limits, what comes back into binds.
 #include "support/statement_fixture.h"
 
 namespace {
@@ -59,46 +59,6 @@ TEST_F(Executing, TablesAtTheirLimits) {
         MUST(Prepare("begin select a, a into :1, :2 from t order by a; end;"), Bind(2, Int(plain)));
         MUST(Bind(1, Int(got), OCI_DEFAULT, c.most, &(current = 0)));
         EXPECT_EQ(Execute(), 1414) << "beside a plain bind a table takes one row";
-    }
-}
-
-// What the server says besides comes with a success, in its order; behind a truncation, which is told first.
-TEST_F(Executing, NoticesAreInformation) {
-    if (!OnServer()) return;
-    MustRun("create function told() returns text language plpgsql as "
-            "$$ begin raise warning 'one'; raise warning 'two'; return 'abc'; end $$");
-    for (const bool cut : {false, true}) {
-        char text[9] = "";
-        ub2 code = 0;
-        ASSERT_EQ(Prepare("select told() from dual") + Define(1, {text, cut ? 3 : 9, SQLT_STR, nullptr, nullptr, &code}), 0);
-        EXPECT_EQ(ExecuteCode(), OCI_SUCCESS_WITH_INFO);
-        std::string told;
-        char words[200];
-        sb4 number = 0;
-        const auto get = [&](ub4 record) {
-            return OCIErrorGet(err, record, nullptr, &number, reinterpret_cast<OraText*>(words), sizeof words, OCI_HTYPE_ERROR);
-        };
-        for (ub4 record = 1; get(record) == OCI_SUCCESS; ++record)
-            told += std::to_string(number) + (std::strstr(words, "one") ? " one " : std::strstr(words, "two") ? " two " : " ");
-        EXPECT_EQ(told, cut ? "24345 20000 one 20000 two " : "20000 one 20000 two ");
-    }
-}
-
-// The longest value whose length an indicator can tell, and the longest that a length can.
-TEST_F(Executing, LengthsAtTheirLimits) {
-    const struct { int whole; sb4 room; sb4 answer; sb2 indicator; ub2 length; } cases[] = {
-        {32766, 10, 24345, 32766, 10}, {32767, 10, 24345, 32767, 10}, {32768, 10, 24345, -2, 10},
-        {65534, 200000, 0, 0, 65534}, {65535, 200000, 0, 0, 65535}, {65536, 200000, 0, 0, 65535},
-        {100003, 200000, 0, 0, 65535}, {100003, 70000, 24345, -2, 65535}};
-    for (const auto& c : cases) {
-        std::string area(static_cast<std::size_t>(c.room), '#');
-        sb2 indicator = 9;
-        ub2 code = 0, length = 9;
-        EXPECT_EQ(Query("select printf('%.*c', " + std::to_string(c.whole) + ", 'x') from dual",
-                        {{area.data(), c.room, SQLT_CHR, &indicator, &length, &code}}), c.answer)
-            << c.whole << " in " << c.room;
-        EXPECT_EQ(indicator, c.indicator) << c.whole << " in " << c.room;
-        EXPECT_EQ(length, c.length) << c.whole << " in " << c.room;
     }
 }
 

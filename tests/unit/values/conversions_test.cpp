@@ -25,19 +25,6 @@ protected:
     alignas(16) char area_[16] = "no such object!";
 };
 
-TEST_F(Conversions, ATimeAloneIsNoDate) {
-    auto* time = NewDescriptor<OCIDateTime>(OCI_DTYPE_TIME);
-    ASSERT_EQ(OCI_datetimeSetTime(env, err, time, 10, 20, 30, 0), OCI_SUCCESS);
-    EXPECT_EQ(In(Raw(time), SQLT_TIME, ":1"), OnServer() ? "!1843" : "10:20:30");
-    MustRun("create table moments(d date, t timestamp)");
-    for (const char* column : {"d", "t"}) {
-        ASSERT_EQ(Ready("insert into moments(" + std::string(column) + ") values(:1)", {{&time, 8, SQLT_TIME}}), 0);
-        EXPECT_EQ(Execute(), 1843) << column;
-    }
-    EXPECT_EQ(One("select count(*) from moments"), "0");
-    EXPECT_EQ(One("select cast('10:20:30' as timestamp) from dual"), OnServer() ? "!1861" : "!932");
-}
-
 // With either engine: descriptors and texts in and out, of columns and of expressions; the other span is refused.
 TEST_F(Conversions, IntervalColumns) {
     auto* months = NewDescriptor<OCIInterval>(OCI_DTYPE_INTERVAL_YM);
