@@ -201,11 +201,18 @@ private:
     void AddStep(Run run, std::size_t first, std::size_t last) {
         Step step;
         step.run = run == Run::rollback && NamesSavepoint(first, last) ? Run::savepoint : run;
+        if (step.run == Run::commit || step.run == Run::rollback) CheckEnd(first + 1, last);
         step.begin = first < last ? Offset(tokens_[first].begin) : 0;
         step.end = first < last ? Offset(tokens_[last - 1].End()) : 0;
         if (run == Run::change || (run == Run::query && result_.is_block)) FindInto(step, first, last);
         if (run == Run::query || run == Run::open_cursor || run == Run::assign) step.locks_rows = LocksRows(first, last);
         result_.steps.push_back(std::move(step));
+    }
+
+    // The engine never sees a commit or rollback: one of something else, or with more to do, is none.
+    void CheckEnd(std::size_t next, std::size_t last) {
+        if (next < last && (tokens_[next].Is("work") || tokens_[next].Is("transaction"))) ++next;
+        if (next < last) Fail(errors::kNotProperlyEnded, tokens_[next]);
     }
 
     bool NamesSavepoint(std::size_t first, std::size_t last) const {
