@@ -186,7 +186,7 @@ Status ChunkedBytes::Fill(std::uint64_t size, const Reader& read) {
 }
 
 void ChunkedBytes::Trim(std::uint64_t size) noexcept {
-    size_ = std::min(size_, size);
+    size_ = size;
     if (chunks_.empty()) {
         memory_.resize(static_cast<std::size_t>(size_));
         return;

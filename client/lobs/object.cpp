@@ -121,8 +121,8 @@ Status LargeObject::Read(std::uint64_t bytes, std::size_t most_bytes, std::uint6
     if (!HasCharacters()) return units = read, Status();
     if (read > wanted) text.resize(utf::WholeUtf8(text, static_cast<std::size_t>(wanted)));
     units = CountCharacters(text);
-    for (std::size_t at = text.size(); units > most_units && at-- > 0;) {
-        if (!Begins(text[at])) continue;
+    for (std::size_t at = text.size(); units > most_units;) {
+        if (!Begins(text[--at])) continue;
         text.resize(at);
         --units;
     }

@@ -132,7 +132,8 @@ bool IsOpen(const LargeObject& object, const Link& link) {
 
 Status CheckOpenForWriting(const LargeObject& object, const Link& link) {
     for (const auto& entry : link.lobs->buffered) {
-        if (entry.waits && entry.lob->IsSame(object.Lob()) && entry.by.lock() != object.Located().kept)
+        const auto by = entry.by.lock();    // null: what waited is gone with its locator
+        if (by && entry.waits && entry.lob->IsSame(object.Lob()) && by != object.Located().kept)
             return Error(errors::kTwoLocatorsModify);
     }
     const auto found = FindOpened(object, *link.lobs);
@@ -229,7 +230,6 @@ Status Flush(LargeObject& object) {
 }
 
 Status WriteIntoBuffer(LargeObject& object, std::uint64_t at, std::string_view data, std::uint64_t units) {
-    if (Status status = object.Lob().CheckWrite(); status.Failed()) return status;
     WriteBuffer& buffer = *object.State().buffer;
     const bool follows = buffer.units > 0 && at == buffer.first + buffer.units;
     if (!follows) {

@@ -33,7 +33,6 @@ std::shared_ptr<Stream> StreamOf(const Link& link) { return std::static_pointer_
 
 // Characters of the national form are UTF-16 where neither the call nor the environment names a set.
 Status FindForm(const LobDescriptor& descriptor, const TransferArguments& arguments, Stream& stream) {
-    stream.form = Form::bytes;
     if (!stream.object.HasCharacters()) return {};
     if (arguments.form > SQLCS_NCHAR) return Error(errors::kBadLobForm);
     const Environment::CharacterSets& sets = descriptor.Env().Sets();
@@ -80,7 +79,7 @@ private:
 
 std::uint64_t Left(const Stream& stream) {
     const std::uint64_t done = stream.amount.in_bytes ? stream.bytes : stream.units;
-    return stream.amount.value == 0 ? ~std::uint64_t{0} : stream.amount.value - std::min(done, stream.amount.value);
+    return stream.amount.value == 0 ? ~std::uint64_t{0} : stream.amount.value - done;
 }
 
 // One block into the room; nothing where the next character does not fit. Of sets of their own so many characters as
@@ -92,7 +91,7 @@ Status ReadBlock(Stream& stream, char* out, std::uint64_t room, Transferred& don
     std::uint64_t most_bytes = std::min<std::uint64_t>(room, kBlock);
     if (stream.form == Form::other) {
         const auto widest = static_cast<std::uint64_t>(charset::MostBytes(*stream.set));
-        most_units = std::min(most_units, std::max<std::uint64_t>(std::min<std::uint64_t>(room, kBlock) / widest, 1));
+        most_units = std::min(most_units, std::max<std::uint64_t>(room / widest, 1));
         most_bytes = kBlock;
     }
     std::string& block = stream.block;
@@ -182,7 +181,7 @@ Status CheckAnnounced(const Stream& stream, std::uint64_t units, std::uint64_t b
     if (announced == 0) return {};
     const bool fits = stream.bytes + bytes <= announced || (!stream.amount.in_bytes && stream.units + units <= announced);
     if (!fits) return Error(errors::kMoreThanAnnounced);
-    const bool matches = stream.bytes + bytes == announced || (!stream.amount.in_bytes && stream.units + units == announced);
+    const bool matches = stream.bytes + bytes == announced || stream.units + units == announced;
     return last && !matches ? Error(errors::kLessThanAnnounced) : Status();
 }
 
@@ -205,7 +204,7 @@ Status WritePiece(Stream& stream, std::string_view data, bool last) {
 
 Status StartWriting(LobDescriptor& descriptor, Link& link, const TransferArguments& arguments, Stream& stream) {
     if (Status status = Find(descriptor, link, stream.object); status.Failed()) return status;
-    if (arguments.offset == 0 && !arguments.appends) return Error(errors::kBadLobParameter);
+    if (arguments.offset == 0) return Error(errors::kBadLobParameter);
     if (Status status = FindForm(descriptor, arguments, stream); status.Failed()) return status;
     if (Status status = CheckOpenForWriting(stream.object, link); status.Failed()) return status;
     if (Status status = stream.object.Lob().CheckWrite(); status.Failed()) return status;

@@ -136,7 +136,7 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
         return OCI_CONTINUE;
     };
     EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 4, this, asks, 0, 0)), 0);
-    const auto breaks = [](dvoid* context, const dvoid*, ub4, ub1) -> sb4 {
+    const auto breaks = [](dvoid* context, auto...) -> sb4 {
         auto& self = *static_cast<decltype(this)>(context);
         EXPECT_EQ(OCIBreak(self.svc, self.err), OCI_SUCCESS);
         return OCI_CONTINUE;
@@ -145,13 +145,18 @@ TEST_F(Lobs, PiecesGoThroughCallbacks) {
     EXPECT_EQ(Write(other, 1, "12345"), 0);
     EXPECT_EQ(Answer(OCILobRead(svc, err, other, &(amount = 0), 1, room, 4, this, breaks, 0, 0)), 1013);
     MUST(Answer(OCIReset(svc, err)));
-    const auto leaves = [](dvoid* context, dvoid*, ub4* length, ub1* piece) -> sb4 {
+    EXPECT_EQ(Answer(OCILobWrite(svc, err, other, &(amount = 0), 1, room, 4, OCI_FIRST_PIECE, this, breaks, 0, 0)), 1013);
+    MUST(Answer(OCIReset(svc, err)));
+    const auto leaves = [](dvoid* context, auto, auto length, auto piece) -> sb4 {
         auto& self = *static_cast<decltype(this)>(context);
         EXPECT_EQ(OCILogoff(self.svc, self.err), OCI_SUCCESS);
-        *length = 1, *piece = OCI_LAST_PIECE;
+        if constexpr (std::is_pointer_v<decltype(piece)>) *length = 1, *piece = OCI_LAST_PIECE;
         return OCI_CONTINUE;
     };
     EXPECT_EQ(Answer(OCILobWrite(svc, err, lob, &(amount = 0), 1, room, 4, OCI_FIRST_PIECE, this, leaves, 0, 0)), 3114);
+    ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
+    Temporary(lob), Write(lob, 1, "ab");
+    EXPECT_EQ(Answer(OCILobRead(svc, err, lob, &(amount = 0), 1, room, 4, this, leaves, 0, 0)), 3114);
     ASSERT_EQ(Logon(&svc), OCI_SUCCESS);
 }
 
@@ -177,8 +182,8 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     EXPECT_EQ(Write(lob, kPast, "x"), 22925);
     EXPECT_EQ(Read(lob, kPast), "11:h\xC3\xA4llo world");
     oraub8 bytes = 1;
-    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &bytes, ~oraub8{0}, room, 1, 0, nullptr, nullptr, 0, 0)),
-              24281);
+    for (const auto& [offset, answer] : {std::pair{~oraub8{0}, 24281}, {(oraub8{1} << 36) + 1, 24281}, {oraub8{1} << 36, 22925}})
+        EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, nullptr, &bytes, offset, room, 1, 0, nullptr, nullptr, 0, 0)), answer);
     const struct { bool of_bytes; oraub8 bytes, characters, told_bytes, told_characters; } reads[] = {
         {false, 3, 0, 3, 2}, {false, 0, 9, 6, 5}, {true, 9, 1, 3, 3}};
     for (const auto& c : reads) {
@@ -198,6 +203,8 @@ TEST_F(Lobs, NullPlacesAndWideAmounts) {
     oraub8 two = 2;
     SHOULD(Answer(OCILobWrite2(svc, err, lob, nullptr, &two, 1, room, 5, 0, nullptr, nullptr, 0, 0)));
     EXPECT_EQ(two, 2u) << "in characters";
+    EXPECT_EQ(OCILobWrite2(svc, err, lob, &(bytes = 2), nullptr, 1, room, 2, OCI_FIRST_PIECE, nullptr, nullptr, 0, 0), OCI_NEED_DATA);
+    EXPECT_EQ(Answer(OCILobWrite2(svc, err, lob, &bytes, nullptr, 1, room + 2, 1, OCI_LAST_PIECE, nullptr, nullptr, 0, 0)), 24810);
     Temporary(other);
     MUST(Answer(OCILobEnableBuffering(svc, err, other)));
     EXPECT_EQ(Write(other, 1, std::string(512 << 10, 'x')), 0);
@@ -218,6 +225,10 @@ TEST_F(Lobs, PiecesThatAreNotFinished) {
     EXPECT_EQ(Write(other, 99, "\xA4", OCI_LAST_PIECE, &amount), 0) << "the offset is not looked at";
     EXPECT_EQ(Read(lob, 11, 1, 4), "more 4:h\xC3\xA4l");
     EXPECT_EQ(Answer(OCI_ERROR), 3130);
+    MUST(Answer(OCIBreak(svc, err)));
+    EXPECT_EQ(Read(lob), "!1013");
+    MUST(Answer(OCIReset(svc, err)));
+    EXPECT_EQ(Read(lob, 11, 1, 4), "more 4:h\xC3\xA4l") << "from the beginning";
     EXPECT_EQ(Read(other), "!24804");
     EXPECT_EQ(Write(lob, 1, "x"), 24804);
     EXPECT_EQ(Answer(OCILobGetLength(svc, err, lob, &length)), 24820);
