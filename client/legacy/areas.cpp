@@ -136,13 +136,9 @@ std::size_t CountCursors(const Login& login) {
     }));
 }
 
-std::shared_ptr<Cursor> ForgetCursor(const void* area) {
+void ForgetCursor(const void* area) {
     const std::lock_guard lock(Known().mutex);
-    const auto found = Known().cursors.find(area);
-    if (found == Known().cursors.end()) return nullptr;
-    std::shared_ptr<Cursor> cursor = std::move(found->second);
-    Known().cursors.erase(found);
-    return cursor;
+    Known().cursors.erase(area);
 }
 
 std::shared_ptr<Login> ForgetLogin(const void* area, std::vector<std::shared_ptr<Cursor>>& cursors) {

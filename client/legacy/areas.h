@@ -105,9 +105,9 @@ std::shared_ptr<Cursor> FindCursor(const void* area);
 void Enter(const void* area, std::shared_ptr<Login> login);
 void Enter(const void* area, std::shared_ptr<Cursor> cursor);
 std::size_t CountCursors(const Login& login);
-// What was known is no longer; null when nothing was.
-std::shared_ptr<Cursor> ForgetCursor(const void* area);
-// The login, and the cursors on it as `cursors`.
+// For who holds the cursor. It may be forgotten with its login already.
+void ForgetCursor(const void* area);
+// The login, and the cursors on it as `cursors`; null when none was known.
 std::shared_ptr<Login> ForgetLogin(const void* area, std::vector<std::shared_ptr<Cursor>>& cursors);
 // Once it is forgotten: whoever waits for its turn finds it ended.
 void EndLogin(Login& login, const std::vector<std::shared_ptr<Cursor>>& cursors) noexcept;

@@ -109,7 +109,6 @@ void NoteRow(const Cursor& cursor, Cda_Def& area) {
     }
     const CallInFlight call;
     const auto* const row_id = Live<RowIdDescriptor>(cursor.row_id);
-    if (!row_id || !row_id->value) return;
     const auto row = static_cast<std::uint64_t>(row_id->value->row);
     area.rid.rcs8 = static_cast<ub2>(row);
     area.rid.rcs7 = static_cast<ub4>(row >> 16);
@@ -132,7 +131,7 @@ int Run(Cursor& cursor, Cda_Def& area, ub4 iterations, ub4 first) {
     else if (!goes_on) NoteOffset(cursor, area);
     const bool undone = result != 0 && cursor.undoes_all;
     if (!cursor.is_query && !undone) area.rpc = Attribute<ub4>(cursor, OCI_ATTR_ROW_COUNT);
-    if (result == 0 && area.rpc == 1 && !cursor.is_query) NoteRow(cursor, area);
+    if (result == 0 && area.rpc == 1) NoteRow(cursor, area);
     return result == 0 && cursor.is_query ? Opened(cursor) : result;
 }
 
@@ -242,9 +241,9 @@ int DescribeColumn(Cursor& cursor, Cda_Def& area, sword position, const ColumnPl
 }
 
 // What a cursor waits for goes with it; the register has let it go.
-void End(const std::shared_ptr<Cursor>& cursor) {
-    cursor->ended = true;
-    EndResult(*cursor);
+void End(Cursor& cursor) {
+    cursor.ended = true;
+    EndResult(cursor);
 }
 
 }  // namespace
@@ -283,14 +282,15 @@ sword OpenCursor(Cda_Def* area, Lda_Def* login_area) {
 }
 
 sword CloseCursor(Cda_Def* area) {
-    return OnCursor(area, Function::oclose, [area](Cursor&) {
-        End(ForgetCursor(area));
+    return OnCursor(area, Function::oclose, [area](Cursor& cursor) {
+        ForgetCursor(area);
+        End(cursor);
         return 0;
     });
 }
 
 void EndResults(const std::vector<std::shared_ptr<Cursor>>& cursors) {
-    for (const auto& cursor : cursors) End(cursor);
+    for (const auto& cursor : cursors) End(*cursor);
 }
 
 sword Parse(Cda_Def* area, const text* sql, sb4 length, bool deferred, ub4 language) {

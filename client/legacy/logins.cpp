@@ -91,8 +91,6 @@ void NoteMessage(Login& login, int number, const char* message) noexcept {
     }
 }
 
-bool IsGone(int number) { return number == errors::kNotLoggedOn || number == errors::kNotConnected; }
-
 void Put(std::string_view message, text* buffer, std::size_t size) {
     const std::size_t length = std::min(message.size(), size - 1);
     std::memcpy(buffer, message.data(), length);
@@ -109,15 +107,11 @@ int Outcome(sword code, OCIError* error, Login& login) noexcept {
     sb4 number = 0;
     OraText message[1024];
     const sword found = OCIErrorGet(error, 1, nullptr, &number, nullptr, 0, OCI_HTYPE_ERROR);
-    if (found == OCI_ERROR) return errors::kOutOfMemory;    // for the record
-    if (found != OCI_SUCCESS) {
-        return code == OCI_SUCCESS_WITH_INFO ? 0 : errors::kInternalError;
-    }
+    if (found != OCI_SUCCESS) return errors::kOutOfMemory;    // for the record
     if (code == OCI_SUCCESS_WITH_INFO) return number == errors::kTruncationWarning ? errors::kTruncationWarning : 0;
     const sword told = OCIErrorGet(error, 1, nullptr, nullptr, message, sizeof message, OCI_HTYPE_ERROR);
     NoteMessage(login, number, told == OCI_SUCCESS ? reinterpret_cast<const char*>(message) : "");
-    if (number == errors::kNotPrepared) return errors::kNotParsed;
-    return number == errors::kNotExecuted ? errors::kFetchOutOfSequence : number;
+    return number;
 }
 
 int Outcome(sword code, Cursor& cursor) noexcept {
@@ -174,7 +168,7 @@ sword LogOff(Lda_Def* area) {
         cursors.reserve(CountCursors(login));    // nothing fails once the session has ended
         const int result =
             login.borrowed ? 0 : Outcome(OCILogoff(login.service, login.error), login.error, login);
-        if (result != 0 && !IsGone(result)) return result;
+        if (result != 0 && result != errors::kNotConnected) return result;
         (void)ForgetLogin(area, cursors);
         for (const auto& cursor : cursors) cursor->ended = true;
         login.ended = true;

@@ -67,7 +67,7 @@ int Bind(Cursor& cursor, Name name, Place place, Table table, const Steps* steps
 
 int DefineColumn(Cursor& cursor, sword position, Place place, const Steps* steps) {
     if (position < 1 || position > kMostColumns) return errors::kNoSuchColumn;
-    if (cursor.compiled || cursor.has_result) {
+    if (cursor.compiled) {
         if (const int failed = Compile(cursor)) return failed;
         if (const int failed = CheckColumn(cursor, position)) return failed;
     }
@@ -98,9 +98,7 @@ int FindWanted(Cursor& cursor, Wanted& wanted, PieceArea& area) {
                                                    &direction, &wanted.iteration, &wanted.index, &wanted.piece),
                                cursor);
     if (result != 0) return result;
-    const auto found = cursor.pieces.find(wanted.handle);
-    if (found == cursor.pieces.end()) return errors::kIllegalOperation;
-    area = found->second;
+    area = cursor.pieces.at(wanted.handle);
     return 0;
 }
 

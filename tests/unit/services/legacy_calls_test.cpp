@@ -81,6 +81,7 @@ TEST_F(LegacyCalls, AreasThatAreNotKnownAreNeitherReadNorWritten) {
     EXPECT_EQ(std::memcmp(&before, &unknown, sizeof unknown), 0);
     EXPECT_EQ(oopen(&lda, &lda, nullptr, -1, -1, nullptr, -1), 1001);
     EXPECT_EQ(LogOn(user, database), 1015);
+    EXPECT_EQ(olog(&cda, reinterpret_cast<ub1*>(&unknown), Text(""), 0, nullptr, -1, nullptr, -1, 0), 1001);
     EXPECT_EQ(oopen(&unknown, &cda, nullptr, -1, -1, nullptr, -1), 1001);    // a maker: clears, and leaves rc
     EXPECT_EQ(std::make_tuple(unknown.rc, unknown.ose), std::make_tuple(1001, 0));
 }
@@ -92,13 +93,15 @@ TEST_F(LegacyCalls, BesideTheTranscripts) {
         EXPECT_EQ(std::make_tuple(cda.rid.rd.rcs5, cda.rid.rcs7, cda.rid.rcs8), std::make_tuple(0x0102, 0x03040506u, 0x0708));
     }
     ub4 count = 5;
-    EXPECT_EQ(odessp(&lda, Text("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
-                     nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &count), 4043);
+    for (ub4* place : {&count, static_cast<ub4*>(nullptr)})
+        EXPECT_EQ(odessp(&lda, Text("p"), 1, nullptr, 0, nullptr, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr,
+                         nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, place), 4043);
     EXPECT_EQ(count, 0u);
     ASSERT_EQ(Parse("select -987.65, 'abcdef' from dual where :v is null"), 0);
     for (const sword type : {65536 + SQLT_CHR, -1}) EXPECT_EQ(Bind("v", characters.data(), 8, type), 1024) << type;
     EXPECT_EQ(obindps(&cda, 1, Text("v"), -1, nullptr, 10, SQLT_CHR, -1, nullptr, nullptr, nullptr, 0, 0, 0, -1, 0, nullptr,
                       nullptr, -1, -1), 1025);
+    EXPECT_EQ(obndrv(&cda, Text("v"), -1, nullptr, -1, SQLT_STR, -1, nullptr, nullptr, -1, -1), 1025);
     sb2 null = -1;
     EXPECT_EQ(obndrv(&cda, Text("v"), -1, nullptr, 1, SQLT_CHR, -1, &null, nullptr, -1, -1), 0);
     std::array<ub1, 3> packed{};
@@ -141,8 +144,10 @@ TEST_F(LegacyCalls, TextsOfNumbers) {
     cda.peo = 0;
     EXPECT_EQ(oexec(&cda), 904);
     EXPECT_EQ(cda.peo, 8);
-    EXPECT_EQ(oerhms(&lda, 904, message.data(), 5), 0);
-    EXPECT_STREQ(words, "[KEL");
+    for (const sword size : {5, 1}) {
+        EXPECT_EQ(oerhms(&lda, 904, message.data(), size), 0);
+        EXPECT_STREQ(words, size == 5 ? "[KEL" : "");
+    }
     EXPECT_EQ(oerhms(nullptr, 942, message.data(), 0), 1009);
 }
 
@@ -164,6 +169,7 @@ TEST_F(LegacyCalls, AContextThatLendsItsSessionGoes) {
     const std::size_t slash = user.find('/');
     ASSERT_EQ(OCILogon(env, err, &service, Text(user), static_cast<ub4>(server ? slash : 0), Text("secret"),
                        server ? 6 : 0, Text(database), static_cast<ub4>(database.size())), 0);
+    for (Lda_Def* area : {static_cast<Lda_Def*>(nullptr), &cda, &lda}) EXPECT_EQ(OCISvcCtxToLda(service, err, area), OCI_ERROR);
     MUST(OCISvcCtxToLda(service, err, &lent), oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1));
     if (server) {
         MUST(oparse(&cursor, Text("select pg_sleep(0.5)"), -1, 1, 2), onbset(&lent));
@@ -185,8 +191,11 @@ TEST_F(LegacyCalls, CallsAreLeftUnfinished) {
         MUST(Parse("select n from t"), Define(1, &value, 4, SQLT_INT), oexec(&cda), ofetch(&cda), ocom(&lda));
         return;
     }
+    Cda_Def beside{};
+    MUST(oopen(&beside, &lda, nullptr, -1, -1, nullptr, -1), oparse(&beside, Text("select 1"), -1, 1, 2));
     MUST(Parse("select n from (select 7 as n, pg_sleep(0.3)) s"), Define(1, &value, 4, SQLT_INT));
     EXPECT_EQ(oexec(&cda), 3123);
+    EXPECT_EQ(oexec(&beside), 3127) << "which is another";
     EXPECT_EQ(cda.v2_rc, -3123);
     for (auto* call : {ofetch, ocan, oclose}) EXPECT_EQ(call(&cda), 3127);
     EXPECT_EQ(Open(), 3127) << "which would close it";
