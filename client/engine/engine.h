@@ -158,7 +158,7 @@ struct ObjectDescription {
     std::string name;
     std::vector<Column> columns;          // of tables and views
     std::string target_schema, target;    // of synonyms
-    std::int64_t sequence_start = 1, sequence_step = 1, sequence_least = 1, sequence_most = 0;
+    std::int64_t sequence_step = 1, sequence_least = 1, sequence_most = 0;
     std::optional<std::int64_t> sequence_cache;    // how many are taken at a time, where the engine tells
     std::optional<std::int64_t> sequence_mark;     // the last number that was taken, or the first of all
     std::vector<std::string> members;     // of schemas: the names of their objects; of the database: its schemas

@@ -304,10 +304,10 @@ Status PgConnection::Commit() {
     }
     Status status = wire_->Run("commit");
     Note();
-    if (in_transaction_ && !status.Ok()) return Lose(status);
+    if (in_transaction_) return Lose(status);
     const bool violated = status.Number() == 1 || status.Number() == errors::kParentMissing ||
                           status.Number() == errors::kChildFound || status.Number() == errors::kCheckViolated;
-    return violated && !in_transaction_ ? Refused(errors::kRolledBack, status.Detail()) : status;
+    return violated ? Refused(errors::kRolledBack, status.Detail()) : status;
 }
 
 Status PgConnection::Rollback() {
@@ -401,7 +401,6 @@ PgConnection::SavepointCommand PgConnection::ReadSavepoint(std::string_view sql)
     }
     if (at == 0 || at == pieces.size() || !IsName(pieces[at])) return {};
     const std::string_view name = pieces[at++];
-    if (at < pieces.size() && pieces[at] == ";") ++at;
     if (at < pieces.size()) return {};
     command.name = PlainName(name);
     if (command.name.empty()) return {};
@@ -429,7 +428,6 @@ void PgConnection::NoteSavepoint(const SavepointCommand& command) {
     const auto found = std::find_if(savepoints_.rbegin(), savepoints_.rend(),
                                     [&](const Savepoint& savepoint) { return savepoint.name == command.name; });
     ForgetLockWait();
-    if (found == savepoints_.rend()) return;
     const auto kept = found.base() - (command.verb == SavepointCommand::Verb::drop ? 1 : 0);
     savepoints_.erase(kept, savepoints_.end());
 }

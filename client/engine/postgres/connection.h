@@ -64,7 +64,7 @@ public:
     LobStore* Lobs() override;
     void WaitForLocks(bool waits) noexcept override { waits_ = waits; }
     Status Ping() override;
-    [[nodiscard]] bool Broken() const override { return wire_->Broken() || (!in_transaction_ && wire_->Closed()); }
+    [[nodiscard]] bool Broken() const override { return wire_->Broken() || wire_->Closed(); }
     void Interrupt() noexcept override { wire_->Wake(); }
 
     // ---- For queries and descriptions

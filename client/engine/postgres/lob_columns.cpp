@@ -17,7 +17,7 @@ std::optional<std::size_t> EndOfList(std::string_view sql, std::size_t& end_of_t
     const PieceList pieces = Split(sql);
     std::optional<ListOfTable> read = ReadSelect(pieces);
     if (!read) read = ReadReturning(pieces);
-    if (!read || read->list.Size() == 0) return {};
+    if (!read) return {};
     const auto end_of = [&](std::size_t piece) {
         return static_cast<std::size_t>(pieces[piece].data() - sql.data()) + pieces[piece].size();
     };

@@ -45,8 +45,7 @@ public:
     Status TakeWhole(std::span<const std::byte> whole, bool brief);
     [[nodiscard]] bool IsSame(const Lob& other) const override {
         const auto* column = dynamic_cast<const ColumnLob*>(&other);
-        return column && row_ && column->shared_ == shared_ && column->row_ == row_ &&
-               column->column_->name == column_->name;
+        return column && column->row_ == row_ && column->column_->name == column_->name;
     }
     [[nodiscard]] std::uint64_t Version() const override {
         return is_current_ && shared_->store ? shared_->store->now_ + shared_->store->writes_ : 0;
@@ -181,7 +180,6 @@ Status ColumnLob::Draft(Lob*& draft) {
 
 Status ColumnLob::Write(std::uint64_t offset, std::span<const std::byte> in) {
     if (Status status = CheckWrite(); status.Failed()) return status;
-    if (in.empty()) return {};
     if (offset > kLongest || in.size() > kLongest - offset) return Refused(errors::kLobTooLarge);
     Lob* draft = nullptr;
     if (Status status = Draft(draft); status.Failed()) return status;

@@ -39,7 +39,7 @@ constexpr const char* kFind =
     " and case when $2 = '' then pg_catalog.pg_table_is_visible(c.oid) else n.nspname = $2 end"
     " and c.relkind in ('r', 'p', 'f', 'v', 'm', 'S')";
 constexpr const char* kSequence =
-    "select seqstart, seqincrement, seqmin, seqmax from pg_catalog.pg_sequence where seqrelid = $1::oid";
+    "select seqincrement, seqmin, seqmax from pg_catalog.pg_sequence where seqrelid = $1::oid";
 constexpr const char* kSchema = "select nspname from pg_catalog.pg_namespace where nspname = $1";
 constexpr const char* kMembers =
     "select c.relname, c.relkind from pg_catalog.pg_class c join pg_catalog.pg_namespace n on n.oid = c.relnamespace"
@@ -93,10 +93,9 @@ Status PgConnection::Describe(std::string_view name, ObjectKind kind, ObjectDesc
     }
     if (!status.Ok()) return status;
     if (is_sequence && PQntuples(rows.get()) == 1) {
-        described.sequence_start = Integer(rows, 0);
-        described.sequence_step = Integer(rows, 1);
-        described.sequence_least = Integer(rows, 2);
-        described.sequence_most = Integer(rows, 3);
+        described.sequence_step = Integer(rows, 0);
+        described.sequence_least = Integer(rows, 1);
+        described.sequence_most = Integer(rows, 2);
     }
     object = std::move(described);
     return status;

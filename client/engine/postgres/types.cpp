@@ -197,7 +197,6 @@ int TextToInterval(std::string_view text, ValueRoom& room, Datum& value) {
     const std::string_view plain = text.substr(is_negative);
     char with_days[date::kMaxIntervalText + 2] = "0 ";
     const bool has_days = plain.find_first_of(" -") != plain.npos;
-    if (plain.size() > date::kMaxIntervalText) return errors::kBadInterval;
     const std::string_view whole =
         has_days ? plain : std::string_view(with_days, 2 + plain.copy(with_days + 2, date::kMaxIntervalText));
     const date::Span span = plain.find('-') != plain.npos ? date::Span::year_month : date::Span::day_second;
@@ -305,7 +304,7 @@ void DescribeType(Oid type, int modifier, Column& column) {
     column.characters = 0;
     if (modifier < 0) return;
     if (type == kFixed || type == kVarying) {
-        column.characters = static_cast<std::uint32_t>(std::max(modifier - kModifierHeader, 0));
+        column.characters = static_cast<std::uint32_t>(modifier - kModifierHeader);
         column.size = column.characters * kBytesOfCharacter;
     } else if (type == oid::kNumeric) {
         DescribeNumber(modifier, column);
@@ -493,12 +492,7 @@ int BoundValues::WriteOwn(std::size_t index, std::string_view text) {
 
 int BoundValues::WriteTime(std::size_t index, const date::DateTime& value) {
     std::int64_t microseconds = 0;
-    const Oid type = types_[index];
-    if (type != oid::kTimestamp && type != oid::kMoment) {
-        char text[date::kMaxEngineText];
-        return WriteOwn(index, {text, date::ToEngineText(value, text)});
-    }
-    const int error = type == oid::kMoment ? MomentFrom(value, microseconds) : MicrosecondsFrom(value, microseconds);
+    const int error = types_[index] == oid::kMoment ? MomentFrom(value, microseconds) : MicrosecondsFrom(value, microseconds);
     if (error != 0) return error;
     std::string& room = rooms_[index];
     room.resize(sizeof microseconds);

@@ -166,7 +166,8 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
     ASSERT_EQ(Run("create table t(n integer)"), 0);
     engine::Xid xid{.format = -7, .global_length = 64, .branch_length = 64, .data = {'x', '\0', '\xFF'}};
     xid.data[63] = '\xA7', xid.data[125] = '\x5B', xid.data[127] = '\xFF';
-    const char* const others[] = {"other", "kelp.1.QQ", "kelp.x.QQ.QQ", "kelp.1.Q*.QQ"};    // whose names are like ours
+    const std::string others[] = {"other", "kelp.1", "kelp.1.QQ", "kelp.x.QQ.QQ", "kelp.1.Q*.QQ", "kelp.1.QQ.Q*",
+                                  "kelp.1." + std::string(87, 'A') + ".QQ"};    // whose names are like ours
     bool read_only = true;
     std::vector<engine::Xid> prepared;
     EXPECT_EQ(database_->GetCapabilities().lobs, connection_->Lobs() != nullptr);
@@ -191,9 +192,9 @@ TEST_P(Contract, PreparedBranchIsFinishedByAnyConnectionOrRefused) {
         SHOULD(Answer(other->KeepsPrepared(xid, kept[1])), Answer(other->KeepsPrepared({.format = 1}, kept[2])));
         EXPECT_TRUE(kept[0] && kept[1] && !kept[2]);
         prepared.clear();
-        for (const std::string name : others) server_->RunHere("begin; select pg_current_xact_id(); prepare transaction '" + name + "'");
+        for (const std::string& name : others) server_->RunHere("begin; select pg_current_xact_id(); prepare transaction '" + name + "'");
         EXPECT_EQ(Answer(other->Recover(prepared)), 0);
-        for (const std::string name : others) server_->RunHere("rollback prepared '" + name + "'");
+        for (const std::string& name : others) server_->RunHere("rollback prepared '" + name + "'");
         EXPECT_EQ(prepared, std::vector{xid});
         ASSERT_EQ(Answer(other->Begin(TransactionMode::read_write)), 0);
         EXPECT_EQ(Answer(other->CommitPrepared(xid)), 24776);

@@ -209,6 +209,8 @@ TEST_F(Postgres, ValuesAtTheirLimits) {
         {"%1::timestamp", Text("2024-02-29 13:02:03"), "2024-02-29 13:02:03;"},
         {"%1::timestamp", Text("29-FEB-24 x"), "error 1830"}, {"%1::interval", Text("1-2"), "1-2;"},
         {"%1::interval", Text("-4 05:06:07.8"), "-4 5:06:07.8;"}, {"%1::interval", Text("7"), "error 1867"},
+        {"%1::timestamp", Text("12:30:00"), "error 1843"}, {"%1::interval", Text("999999999-00"), "error 1873"},
+        {"%1::integer", Text(std::string_view("1\0", 2)), "error 911"},
         {"%1::interval", Text("7 days"), "7 0:00:00;"}, {"%1::bytea", Text("0aFF"), "\\x0aff;"}};
     for (const auto& c : cases)
         EXPECT_EQ(Query("select (" + std::string(c.expression) + ")::text", {c.value}), c.text) << c.text;
