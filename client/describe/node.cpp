@@ -49,19 +49,15 @@ std::shared_ptr<const Node> Columns(std::vector<engine::Column> columns) {
     return list;
 }
 
-// Of a schema's objects the engine may tell the kinds; the database's members are schemas.
+// Of a schema's objects the engine tells the kinds; the database's members are schemas.
 std::shared_ptr<const Node> Members(engine::ObjectDescription& object) {
     const bool of_schema = object.kind == engine::ObjectKind::schema;
     auto list = List(of_schema ? OCI_LTYPE_SCH_OBJ : OCI_LTYPE_DB_SCH, 0);
     for (std::size_t index = 0; index < object.members.size(); ++index) {
         auto node = std::make_shared<Node>();
         node->shown = Shown::member;
-        node->object.kind = engine::ObjectKind::schema;
-        if (of_schema) {
-            const bool told = index < object.member_kinds.size();
-            node->object.kind = told ? object.member_kinds[index] : engine::ObjectKind::any;
-            node->object.schema = object.name;
-        }
+        node->object.kind = of_schema ? object.member_kinds[index] : engine::ObjectKind::schema;
+        if (of_schema) node->object.schema = object.name;
         node->object.name = std::move(object.members[index]);
         node->type = RowOf(node->object.kind).type;
         list->members.push_back(std::move(node));

@@ -29,8 +29,8 @@ struct Dialect {
     std::string_view minus;                  // between two queries, for "minus"
     std::string_view truncate_table;         // for "truncate table"
     bool cuts_for_update = false;            // "for update ..." is left out
-    std::string (*date_literal)(const date::DateTime& value, bool is_date) = nullptr;    // date '...', timestamp '...'
-    std::string (*row_id_literal)(const RowId& row) = nullptr;             // for a row id's text
+    std::string (*date_literal)(const date::DateTime& value, bool is_date);    // date '...', timestamp '...'
+    std::string (*row_id_literal)(const RowId& row);    // for a row id's text
     std::string_view row_id = {};            // for "rowid", a row's own column
     std::string_view subquery_alias = {};    // behind a subquery of a from clause that has none; a number is added
     std::string (*quoted_name)(std::string_view quoted) = nullptr;         // for a name in quotes, which stay

@@ -162,7 +162,7 @@ struct ObjectDescription {
     std::optional<std::int64_t> sequence_cache;    // how many are taken at a time, where the engine tells
     std::optional<std::int64_t> sequence_mark;     // the last number that was taken, or the first of all
     std::vector<std::string> members;     // of schemas: the names of their objects; of the database: its schemas
-    std::vector<ObjectKind> member_kinds; // of schemas: the kinds in the same order; empty: the engine does not tell
+    std::vector<ObjectKind> member_kinds; // of schemas: the kinds in the same order
     std::uint32_t number = 0;             // that the engine knows the object by; 0: none
     std::uint32_t first_page = 0;         // where a table begins in the database's file; 0: the engine does not tell
     bool temporary = false;               // of tables: gone with the session
@@ -256,9 +256,7 @@ public:
     virtual Status Describe(std::string_view name, ObjectKind kind, ObjectDescription& object) = 0;
     // From now on objects without a schema's name are looked for in this one first. Answers the one in use, which stays
     // when the name is empty. 1435 when there is none of that name, or the engine cannot prefer it.
-    virtual Status UseSchema(std::string& schema) {
-        return schema.empty() ? Status() : Error(errors::kNoSuchSchema);
-    }
+    virtual Status UseSchema(std::string& schema) = 0;
     // From its next call on objects are looked for first where another connection looks; null: where nobody has asked for
     // any.
     virtual void PreferSchemaOf(const Connection*) noexcept {}

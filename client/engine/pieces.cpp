@@ -107,8 +107,7 @@ bool IsWord(std::string_view piece, std::string_view lower) {
 
 std::size_t ParameterOf(std::string_view piece) {
     if (piece.size() < 2 || piece[0] != '?') return kNoParameter;
-    const int number = std::atoi(std::string(piece.substr(1)).c_str());
-    return number > 0 ? static_cast<std::size_t>(number) - 1 : kNoParameter;
+    return static_cast<std::size_t>(std::atoi(std::string(piece.substr(1)).c_str())) - 1;
 }
 
 bool IsName(std::string_view piece) {
@@ -117,7 +116,7 @@ bool IsName(std::string_view piece) {
     return first == '"' || first == '`' || first == '[' || first == '_' || std::isalpha(first) || first >= 0x80;
 }
 
-bool IsLiteral(std::string_view piece) { return !piece.empty() && piece[0] == '\''; }
+bool IsLiteral(std::string_view piece) { return piece[0] == '\''; }
 
 bool IsNumber(std::string_view piece) {
     return !piece.empty() && (IsDigit(piece[0]) || (piece[0] == '.' && piece.size() > 1));

@@ -31,8 +31,8 @@ std::size_t FindPiece(const PieceList& pieces, std::size_t from, std::initialize
 }
 
 std::optional<ListOfTable> ReadSelect(const PieceList& pieces) {
-    if (pieces.empty() || !IsWord(pieces[0], "select") || (pieces.size() > 1 && IsWord(pieces[1], "distinct"))) return {};
-    const std::size_t first = pieces.size() > 1 && IsWord(pieces[1], "all") ? 2 : 1;
+    if (pieces.size() < 4 || !IsWord(pieces[0], "select") || IsWord(pieces[1], "distinct")) return {};
+    const std::size_t first = IsWord(pieces[1], "all") ? 2 : 1;
     const std::size_t from = FindPiece(pieces, first, {"from"});
     if (from + 1 >= pieces.size() || !IsName(pieces[from + 1])) return {};
     ListOfTable read;

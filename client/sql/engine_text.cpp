@@ -88,7 +88,7 @@ private:
         result_.placeholders.push_back(static_cast<std::uint32_t>(found - all.begin()));
         const bool has_indicator = IsIndicator(tokens_, index + 1);
         const std::size_t end = tokens_[index + has_indicator].End();
-        const bool runs_on = tokens_[index + 1].kind == TokenKind::number && tokens_[index + 1].begin == end;    // ?5
+        const bool runs_on = tokens_[index + 1].kind == TokenKind::number;    // ?5
         Replace(token, end, dialect_.placeholder(result_.placeholders.size()) + (runs_on ? " " : ""));
         return index + 1 + has_indicator;
     }
@@ -98,8 +98,7 @@ private:
         const Token& token = tokens_[index];
         if (token.text == "''" && !dialect_.empty_text.empty()) return Replace(token, token.End(), dialect_.empty_text);
         rowid::RowId value;
-        if (!row_ids_[index] || !dialect_.row_id_literal) return;
-        if (!rowid::FromText(token.text.substr(1, token.text.size() - 2), &value)) return;
+        if (!row_ids_[index] || !rowid::FromText(token.text.substr(1, token.text.size() - 2), &value)) return;
         engine::RowId row;
         if (rowid::ToBytes(value, row.bytes.data())) Replace(token, token.End(), dialect_.row_id_literal(row));
     }
@@ -151,17 +150,17 @@ private:
             Replace(token, literal.End(), dialect_.bytes_literal(literal.text.substr(1, literal.text.size() - 2)));
             return index + 2;
         }
-        if (!open_.empty() && open_.back().as == index && index > 0) return VisitCastType(index);
+        if (!open_.empty() && open_.back().as == index) return VisitCastType(index);
         if (IsTypePlace(index)) return VisitType(index);
         const bool in_type_size = !open_.empty() && open_.back().is_type_size;
         if (in_type_size && (token.Is("char") || token.Is("byte"))) return Drop(index, token.End());
         if (token.Is("default") && names_columns_ && !defines_code_) VisitDefault(index);
         if (token.Is("rowid") && !dialect_.row_id.empty() && !Previous(index).Is("as")) {
             Replace(token, token.End(), dialect_.row_id);
-        } else if (token.Is("dual") && Previous(index).Is("from") && !dialect_.dual.empty()) {
+        } else if (token.Is("dual") && Previous(index).Is("from")) {
             std::string table(dialect_.dual);
             Replace(token, token.End(), FollowedByAlias(index) ? table : table + " as dual");
-        } else if (token.Is("minus") && At(tokens_, index + 1).Is("select") && !dialect_.minus.empty()) {
+        } else if (token.Is("minus") && At(tokens_, index + 1).Is("select")) {
             Replace(token, token.End(), dialect_.minus);
         } else if (token.Is("truncate") && index == 0 && At(tokens_, 1).Is("table") &&
                    !dialect_.truncate_table.empty()) {
@@ -255,10 +254,10 @@ private:
         std::string arguments;
         int depth = 0;
         std::size_t index = as + 1;
-        if (const auto* type = FindCast(index); type && !type->sizes.empty()) {
+        if (const auto& type = *FindCast(index); !type.sizes.empty()) {
             const std::size_t first = index;
-            index += MatchWords(index, type->written);
-            arguments = ", " + IntervalSizes(first, type->sizes, index);
+            index += MatchWords(index, type.written);
+            arguments = ", " + IntervalSizes(first, type.sizes, index);
         }
         for (; tokens_[index].kind != TokenKind::end; ++index) {
             const Token& token = tokens_[index];
@@ -307,7 +306,7 @@ private:
         for (int depth = 0; tokens_[index].kind != TokenKind::end; ++index) {
             const Token& token = tokens_[index];
             if (token.Is("(")) ++depth;
-            if (depth == 0 && (token.Is(")") || token.Is(",") || token.Is(";"))) break;
+            if (depth == 0 && (token.Is(")") || token.Is(","))) break;
             if (token.Is(")")) --depth;
             const bool ends = index > first && depth == 0 &&
                               std::any_of(std::begin(kConstraints), std::end(kConstraints),
@@ -394,7 +393,7 @@ private:
     }
 
     bool IsDateLiteral(std::size_t index) const {
-        return (tokens_[index].Is("date") || tokens_[index].Is("timestamp")) && dialect_.date_literal &&
+        return (tokens_[index].Is("date") || tokens_[index].Is("timestamp")) &&
                tokens_[index + 1].kind == TokenKind::literal;
     }
 
@@ -440,8 +439,8 @@ private:
     const Token& Previous(std::size_t index) const { return index > 0 ? tokens_[index - 1] : tokens_.back(); }
 
     void Copy(std::size_t end) {
-        if (end > copied_) result_.sql.append(text_.substr(copied_, end - copied_));
-        copied_ = std::max(copied_, end);
+        result_.sql.append(text_.substr(copied_, end - copied_));
+        copied_ = end;
     }
 
     void Replace(const Token& first, std::size_t source_end, std::string_view replacement) {

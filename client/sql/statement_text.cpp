@@ -189,7 +189,7 @@ private:
 
     void PlainStatement() {
         std::size_t last = tokens_.size() - 1;
-        while (last > 0 && tokens_[last - 1].Is(";")) --last;
+        while (tokens_[last - 1].Is(";")) --last;    // the first is a word
         if (!DefinesCode(tokens_)) {
             for (std::size_t index = 0; index < last; ++index)
                 if (tokens_[index].Is(";")) return Fail(errors::kNotProperlyEnded, tokens_[index + 1]);

@@ -52,8 +52,8 @@ Status BindRows::Collect(const BoundText& text, const sql::EngineText& sql) {
     return {};
 }
 
-void KindsOf(const BoundText& text, const sql::EngineText& sql, std::vector<engine::Kind>& kinds) {
-    kinds.clear();
+std::vector<engine::Kind> KindsOf(const BoundText& text, const sql::EngineText& sql) {
+    std::vector<engine::Kind> kinds;
     for (const std::uint32_t placeholder : sql.placeholders) {
         engine::Kind kind = engine::Kind::null;
         if (text.IsBound(placeholder)) {
@@ -63,6 +63,7 @@ void KindsOf(const BoundText& text, const sql::EngineText& sql, std::vector<engi
         const bool as_row_id = kind == engine::Kind::text && text.Scanned().placeholders[placeholder].is_row_id;
         kinds.push_back(as_row_id ? engine::Kind::row_id : kind);
     }
+    return kinds;
 }
 
 Status BindRows::Row(std::uint32_t row, std::span<engine::Datum> values) {

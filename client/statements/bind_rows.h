@@ -12,7 +12,7 @@
 #include "statements/bound_text.h"
 
 // The kind of each of the engine's placeholders, null where nothing is bound yet.
-void KindsOf(const BoundText& text, const sql::EngineText& sql, std::vector<engine::Kind>& kinds);
+std::vector<engine::Kind> KindsOf(const BoundText& text, const sql::EngineText& sql);
 
 class BindRows final : public engine::RowSource {
 public:

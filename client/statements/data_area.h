@@ -54,8 +54,8 @@ struct Callbacks {
     OCICallbackDefine define = nullptr;
     void* out_context = nullptr;
 
-    // Whether values are given or taken by callback, rather than by polling.
-    [[nodiscard]] bool Any() const { return in || out || define; }
+    // Whether a bind's values are given or taken by callback, rather than by polling.
+    [[nodiscard]] bool Any() const { return in || out; }
     [[nodiscard]] bool Serve(bool comes_out) const { return comes_out ? out || define : in != nullptr; }
 };
 

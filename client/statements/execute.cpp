@@ -109,8 +109,7 @@ Status Statement::Compile(std::size_t index, Compiled*& compiled) {
         compiled->text = sql::Rewrite(text_.Text(), Scanned(), Scanned().steps[index], database.GetDialect());
         compiled->rewritten = true;
     }
-    std::vector<engine::Kind> kinds;
-    KindsOf(text_, compiled->text, kinds);
+    std::vector<engine::Kind> kinds = KindsOf(text_, compiled->text);
     if (compiled->query && kinds == compiled->kinds) return {};
     compiled->query.reset();
     compiled->kinds = std::move(kinds);

@@ -1,6 +1,5 @@
 #include "statements/execute_locks.h"
 
-#include <algorithm>
 #include <utility>
 
 #include "handles/environment.h"
@@ -61,7 +60,7 @@ std::vector<ExecuteLocks::Mutex> ExecuteLocks::LocksOfTargets(const Statement& s
     for (Statement* target : statements) {
         Mutex mutex = target->Serial();
         const bool held = !mutex || mutex == service_ || mutex == statement_;
-        if (!held && std::find(locks.begin(), locks.end(), mutex) == locks.end()) locks.push_back(std::move(mutex));
+        if (!held) locks.push_back(std::move(mutex));    // perhaps twice, which it bears
     }
     return locks;
 }

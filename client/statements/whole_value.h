@@ -51,8 +51,8 @@ public:
         object_ = nullptr;
     }
     void Start(std::shared_ptr<engine::Lob> object);    // one of those that stream
-    // Has more at hand when nothing is, unless the value ends. Answers an error's number or 0.
-    int Refill(DataArea& area) { return rest.empty() && object_ ? ReadMore(area) : 0; }
+    // Has more of a value that does not end at hand, when nothing is. Answers an error's number or 0.
+    int Refill(DataArea& area) { return rest.empty() ? ReadMore(area) : 0; }
 
     [[nodiscard]] bool Ends() const { return rest.empty() && !object_; }
     [[nodiscard]] bool IsAtHand() const { return !object_; }    // all that is left of it
