@@ -150,6 +150,7 @@ private:
                 return Fail(errors::kInvalidCharacter, token);    // an engine would take it for a placeholder
             if (token.kind != TokenKind::placeholder) continue;
             if (IsIndicator(tokens_, index)) {
+                if (IsIndicator(tokens_, index - 1)) return Fail(errors::kInvalidCharacter, token);    // a third name
                 result_.placeholders.back().indicator = PlaceholderName(token.text);
                 continue;
             }
