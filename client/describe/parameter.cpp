@@ -39,4 +39,4 @@ Status Parameter::GetMember(std::uint32_t position, void** out) {
     return {};
 }
 
-void* Parameter::GetList() { return &below_.At(0, *Parent(), source_, node_->list); }
+void* Parameter::GetList() { return node_->list ? &below_.At(0, *Parent(), source_, node_->list) : nullptr; }

@@ -116,7 +116,7 @@ bool IsName(std::string_view piece) {
     return first == '"' || first == '`' || first == '[' || first == '_' || std::isalpha(first) || first >= 0x80;
 }
 
-bool IsLiteral(std::string_view piece) { return piece[0] == '\''; }
+bool IsLiteral(std::string_view piece) { return !piece.empty() && piece[0] == '\''; }
 
 bool IsNumber(std::string_view piece) {
     return !piece.empty() && (IsDigit(piece[0]) || (piece[0] == '.' && piece.size() > 1));

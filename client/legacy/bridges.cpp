@@ -12,6 +12,7 @@ int OpenLent(Login& login, ServiceContext& service) {
     if (!login.Open()) return errors::kOutOfMemory;
     const CallInFlight call;
     auto* const environment = Live<Environment>(login.environment);
+    if (!environment) return errors::kOutOfMemory;
     auto* const own = Create<ServiceContext>(*environment, OCI_HTYPE_SVCCTX, 0);
     login.service = AsHandle<OCISvcCtx>(own);
     login.lender = AsHandle<OCISvcCtx>(&service);
@@ -36,6 +37,7 @@ Status Lend(Lda_Def* area, ServiceContext& service) {
 // A context for the session of a login of olog's: the living one that `out` points to, or a new one.
 Status TakeOver(Login& login, OCISvcCtx** out, ErrorHandle& error) {
     auto* const from = Live<ServiceContext>(login.service);
+    if (!from) return Error(errors::kNotConnected);
     auto* service = Live<ServiceContext>(*out);
     Made<ServiceContext> made;
     if (!service) {

@@ -109,6 +109,7 @@ void NoteRow(const Cursor& cursor, Cda_Def& area) {
     }
     const CallInFlight call;
     const auto* const row_id = Live<RowIdDescriptor>(cursor.row_id);
+    if (!row_id || !row_id->value) return;
     const auto row = static_cast<std::uint64_t>(row_id->value->row);
     area.rid.rcs8 = static_cast<ub2>(row);
     area.rid.rcs7 = static_cast<ub4>(row >> 16);

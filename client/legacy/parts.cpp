@@ -41,7 +41,8 @@ sword ReadPart(Cda_Def* area, sword position, const Part& part) {
         if (const int failed = CheckPart(part)) return failed;
         if (cursor.waits != Cursor::Waits::no) return errors::kOperationActive;
         const CallInFlight call;
-        return Read(*Live<Statement>(cursor.statement)->kept_row, position, part);
+        const auto* const statement = Live<Statement>(cursor.statement);
+        return statement ? Read(*statement->kept_row, position, part) : errors::kNotLoggedOn;
     });
 }
 

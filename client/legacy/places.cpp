@@ -98,7 +98,9 @@ int FindWanted(Cursor& cursor, Wanted& wanted, PieceArea& area) {
                                                    &direction, &wanted.iteration, &wanted.index, &wanted.piece),
                                cursor);
     if (result != 0) return result;
-    area = cursor.pieces.at(wanted.handle);
+    const auto found = cursor.pieces.find(wanted.handle);
+    if (found == cursor.pieces.end()) return errors::kIllegalOperation;
+    area = found->second;
     return 0;
 }
 

@@ -139,7 +139,7 @@ void Link::Close() noexcept {
 void Link::GiveBack(GivingBack how) noexcept {
     const SerialLock serial(serial_);
     Connected connected = TakeApart();
-    connected.connection->PreferSchemaOf(nullptr);    // the next session has asked for none
+    if (connected.connection) connected.connection->PreferSchemaOf(nullptr);    // the next session has asked for none
     if (LinkPlace* place = connected.place.get()) place->TakeBack(std::move(connected), std::move(how));
 }
 

@@ -131,7 +131,7 @@ public:
     // Whether a statement may run that ends transactions, or one that does not.
     Status CheckBranch(bool ends_transaction);
     // Of a session that works in no branch.
-    [[nodiscard]] bool InLocalTransaction() const { return local_started || connection_->InTransaction(); }
+    [[nodiscard]] bool InLocalTransaction() const { return local_started || (connection_ && connection_->InTransaction()); }
 
     // Goes on with another connection of the same user; what was made from the one before is dropped, and it is
     // answered as it is, perhaps in a transaction.

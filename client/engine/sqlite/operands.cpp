@@ -32,7 +32,7 @@ bool Contains(const List& list, std::string_view piece) {
 
 bool IsKeyword(std::string_view piece) {
     std::array<char, kLongestKeyword> lower;
-    if (piece.size() > lower.size() || !std::isalpha(static_cast<unsigned char>(piece[0]))) return false;
+    if (piece.empty() || piece.size() > lower.size() || !std::isalpha(static_cast<unsigned char>(piece[0]))) return false;
     std::transform(piece.begin(), piece.end(), lower.begin(),
                    [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
     return std::binary_search(std::begin(kKeywords), std::end(kKeywords), std::string_view(lower.data(), piece.size()));
