@@ -1,5 +1,6 @@
 #include "statements/execute_locks.h"
 
+#include <algorithm>
 #include <utility>
 
 #include "handles/environment.h"
@@ -59,8 +60,9 @@ std::vector<ExecuteLocks::Mutex> ExecuteLocks::LocksOfTargets(const Statement& s
     std::vector<Mutex> locks;
     for (Statement* target : statements) {
         Mutex mutex = target->Serial();
-        const bool held = !mutex || mutex == service_ || mutex == statement_;
-        if (!held) locks.push_back(std::move(mutex));    // perhaps twice, which it bears
+        if (!mutex) mutex = target->LockAlone();    // whoever gives it a session's result first
+        const bool held = mutex == service_ || mutex == statement_;
+        if (!held && std::find(locks.begin(), locks.end(), mutex) == locks.end()) locks.push_back(std::move(mutex));
     }
     return locks;
 }

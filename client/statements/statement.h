@@ -43,6 +43,8 @@ public:
     ~Statement() override;
     [[nodiscard]] std::span<const AttributeRow> Attributes() const override;
     [[nodiscard]] std::shared_ptr<std::recursive_mutex> Serial() override;
+    // Stands for it while it is of no session; as long as the handle, which goes behind all calls that may know it.
+    [[nodiscard]] std::shared_ptr<std::recursive_mutex> LockAlone() { return {std::shared_ptr<void>(), &alone_}; }
     void LinkClosed() noexcept override;
     void ConnectionChanged() noexcept override;
 
@@ -178,6 +180,7 @@ private:
     [[nodiscard]] bool RunsByIteration() const;
 
     std::shared_ptr<StatementShare> share_;    // once a handle needs it
+    std::recursive_mutex alone_;
     BoundText text_;
     Defines defines_;
     std::vector<Compiled> compiled_;    // by step; lives on the link
