@@ -5,11 +5,8 @@
 
 #include "describe/describe_handle.h"
 #include "handles/attributes.h"
-#include "handles/character_set.h"
 #include "handles/environment.h"
-#include "handles/error_handle.h"
 #include "oci.h"
-#include "platform/utf.h"
 
 namespace {
 
