@@ -125,7 +125,7 @@ bool Model::TakeQuoted(Element* element) noexcept {
 bool Model::TakeNamed(Element* element) noexcept {
     for (const Row& row : kRows) {
         if (!letters::StartsWithFolded(rest_, row.name)) continue;
-        const std::string_view from = rest_;
+        element->letters = CaseOf(rest_);
         rest_.remove_prefix(row.name.size());
         element->field = row.field;
         element->width = row.width;
@@ -136,8 +136,6 @@ bool Model::TakeNamed(Element* element) noexcept {
         element->dotted = row.traits & kDotted;
         element->spelled = row.traits & kSpelled;
         if (element->numeric) TakeSuffixes(element);
-        element->text = from.substr(0, from.size() - rest_.size());
-        element->letters = CaseOf(element->text);
         return true;
     }
     return false;
