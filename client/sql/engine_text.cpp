@@ -423,15 +423,13 @@ private:
         return 0;
     }
 
-    // A word of the dialect's lists: one that stands alone, no name's part, no call, no alias; or a call.
+    // A word of the dialect's lists: one that stands alone, or a call; no name's part, no alias.
     const engine::Dialect::Spelling* FindFunction(std::size_t index) const {
         const Token& next = tokens_[index + 1];
-        const bool is_call = next.Is("(");
-        const auto& list = is_call ? dialect_.calls : dialect_.functions;
+        const auto& list = next.Is("(") ? dialect_.calls : dialect_.functions;
         const auto found = std::find_if(list.begin(), list.end(),
                                         [&](const auto& spelling) { return tokens_[index].Is(spelling.written); });
         if (found == list.end() || defines_code_) return nullptr;
-        if (is_call) return Previous(index).Is(".") ? nullptr : &*found;
         if (Previous(index).Is(".") || Previous(index).Is("as") || next.Is(".")) return nullptr;
         return &*found;
     }

@@ -100,7 +100,7 @@ Status Home::Prime(Wire& wire) {
 }
 
 // Without it the server's own meaning is all there is: what fails is answered by the statements that need it.
-void Home::MakeSchema(Wire& wire) { (void)wire.RunScript(kSchemaCommands); }
+void Home::MakeSchema(Wire& wire) { wire.RunScript(kSchemaCommands); }
 
 std::string Home::Where() {
     const std::lock_guard lock(mutex_);

@@ -300,13 +300,11 @@ Status Wire::Run(const char* sql, Result* last) noexcept {
 }
 
 // A pipeline takes single commands alone.
-Status Wire::RunScript(const char* commands) noexcept {
-    if (broken_ || !PQexitPipelineMode(connection_)) return Lost();
+void Wire::RunScript(const char* commands) noexcept {
+    if (broken_ || !PQexitPipelineMode(connection_)) return;
     const Result result(PQexec(connection_, commands));
-    Status status = IsFailure(result.get()) ? Answer(result.get()) : Status();
-    if (status.Failed() && Transaction() != PQTRANS_IDLE) Result(PQexec(connection_, "rollback"));
-    Status settled = Settle();
-    return status.Ok() ? settled : status;
+    if (IsFailure(result.get()) && Transaction() != PQTRANS_IDLE) Result(PQexec(connection_, "rollback"));
+    broken_ = !Settle().Ok();
 }
 
 // ---- Stopping

@@ -83,7 +83,7 @@ public:
     Status Run(const char* sql, Result* last = nullptr) noexcept;
 
     // Several commands in one text, and no row of theirs.
-    Status RunScript(const char* commands) noexcept;
+    void RunScript(const char* commands) noexcept;
 
     // The status of an error's result, or of the connection that was lost with it.
     Status Answer(const PGresult* result, Verb verb = Verb::other) noexcept;
