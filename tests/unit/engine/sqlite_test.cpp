@@ -43,6 +43,8 @@ TEST_F(Sqlite, WhatOtherProgramsWroteIsRead) {
     EXPECT_EQ(Query("select v, d, c, s, i, l from t"),
               "ä€,time 2024-02-29 00:00:00,é ,12:30:00,long,ö€;,null,   ,null,null,;"
               "x,soon,x  ,time 2024-02-29 01:02:03.5 +01:00,+000000020 00:00:00.500000000,null;null,5,null,null,null,5;");
+    EXPECT_EQ(Run("insert into t(d) values(?1)", {Moment({.hour = 12})}), 1843) << "a time alone, which is a text";
+    EXPECT_EQ(Query("select ?1 || v from t where c = 'x'", {Moment({.hour = 12})}), "12:00:00x;");
 }
 
 // Transcripts show what else is refused of their table.
