@@ -105,7 +105,6 @@ Status TakeOwnership(SqliteConnection& connection, const Credentials& credential
     }
     if (status.Ok()) status = connection.Commit();
     if (status.Ok()) return status;
-    taken = false;
     (void)connection.Rollback();    // the first error counts
     return status;
 }

@@ -32,7 +32,7 @@ bool IsCondition(std::string_view piece) {
 bool TakesText(std::string_view function) {
     constexpr std::string_view kPrefixes[] = {"kelp_varchar", "kelp_nvarchar", "kelp_char", "kelp_nchar", kSpanPrefix};
     return IsWord(function, "to_char") || std::any_of(std::begin(kPrefixes), std::end(kPrefixes), [&](std::string_view prefix) {
-               return function.size() >= prefix.size() && IsWord(function.substr(0, prefix.size()), prefix);
+               return IsWord(function.substr(0, prefix.size()), prefix);
            });
 }
 

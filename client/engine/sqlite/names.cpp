@@ -119,7 +119,7 @@ Names::Found Names::ColumnOfQuery(const Table& table, const std::string& name) {
         const auto named = std::find_if(table.names.begin(), table.names.end(), is_called);
         std::vector<Listed> columns;
         const auto at = static_cast<std::size_t>(named - table.names.begin());
-        if (named == table.names.end() || !ExpandQuery(table.query, columns) || at >= columns.size()) return {};
+        if (!ExpandQuery(table.query, columns) || at >= columns.size()) return {};
         return {true, columns[at].column};
     }
     for (const Item& item : Items(table.query)) {

@@ -67,7 +67,7 @@ private:
 
     bool IsNoNumber(Span span) {
         const std::string_view piece = operands_.At(span.first);
-        if (span.Size() == 1 && (piece.back() == '\'' || IsWord(piece, "null"))) return true;
+        if (span.Size() == 1 && piece.back() == '\'') return true;
         const TableColumn* const column = operands_.IsColumn(span) ? names_.Resolve(span) : nullptr;
         if (!column) return false;
         const std::uint16_t type = column->column.type;

@@ -101,11 +101,10 @@ void SubStr(sqlite3_context* context, int count, Arguments arguments) {
     const bool is_bytes = sqlite3_value_type(arguments[0]) == SQLITE_BLOB && !IsNumber(arguments[0]);
     const TextArgument text(arguments[0]);
     std::int64_t position = 0;
-    std::int64_t length = 0;
     int failure = text.Failure() != 0 ? text.Failure() : ReadWhole(arguments[1], position);
     const std::int64_t whole =
         is_bytes ? static_cast<std::int64_t>(Bytes(arguments[0]).size()) : CharacterCount(text.Text());
-    length = whole;
+    std::int64_t length = whole;
     if (failure == 0 && count > 2) failure = ReadWhole(arguments[2], length);
     if (failure != 0) return Refuse(context, failure);
     const std::int64_t first = position > 0 ? position - 1 : position < 0 ? whole + position : 0;

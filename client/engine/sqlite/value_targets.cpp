@@ -99,7 +99,6 @@ Status Convert(std::string_view text, const Column& column, Coercion::Purpose pu
             std::array<char, 40> digits;
             const char* end = std::to_chars(digits.data(), digits.data() + digits.size(), value.real).ptr;
             literal.assign(digits.data(), static_cast<std::size_t>(end - digits.data()));
-            if (literal.find_first_of(".e") == std::string::npos) literal += ".0";
             break;
         }
         default: literal = Literal(value.Text()); break;
