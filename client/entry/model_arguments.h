@@ -60,6 +60,6 @@ inline Status DateText(const date::DateTime& value, const ModelArguments& argume
         text.resize(length);
         number = write();
     }
-    text.resize(number ? 0 : length);
+    text.resize(length);
     return number ? Error(number) : Status();
 }

@@ -26,7 +26,7 @@ Status Convert(const CharacterSet& from, const void* source, size_t length, cons
     if (!charset::ToUtf8(from, {static_cast<const char*>(source), length}, utf8)) return Error(errors::kBadText);
     if (!charset::FromUtf8(to, utf8, text)) return Error(errors::kBadText);
     const size_t whole = charset::Whole(to, text, std::min(room, text.size() / unit + 1) * unit);
-    if (whole > 0) std::memcpy(target, text.data(), whole);
+    std::memcpy(target, text.data(), whole);
     if (written) *written = whole / unit;
     return whole == text.size() ? Status() : Error(errors::kBufferTooSmall);
 }

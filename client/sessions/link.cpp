@@ -148,7 +148,6 @@ Connected Link::TakeApart() noexcept {
     DropUsers(&LinkUser::LinkClosed);
     branch.reset();
     spare.reset();
-    local_started = false;
     lobs->store = nullptr;
     lobs->opened.clear();
     lobs->buffered.clear();
