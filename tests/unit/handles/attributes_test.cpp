@@ -190,7 +190,7 @@ static_assert(OCI_TYPECODE_BFLOAT == 100 && OCI_TYPECODE_BDOUBLE == 101 && OCI_F
 TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     auto* describe = New<OCIDescribe>(OCI_HTYPE_DESCRIBE);
     ASSERT_EQ(Describe(describe, "T", OCI_PTYPE_TABLE), 0);
-    dvoid *root = nullptr, *again = nullptr;
+    dvoid *root = nullptr, *again = nullptr, *memory = nullptr;
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
     for (ub4 position = 1; position <= 3; ++position) again = Below(root, OCI_ATTR_LIST_COLUMNS, position);
     const sb4 blocks = OCI_memGetMemCount();
@@ -200,7 +200,9 @@ TEST_F(AttributesTest, ParametersLiveWithTheirHandle) {
     EXPECT_EQ(Name(again, OCI_ATTR_NAME), "C") << "its object's parameter is gone, its handle lives";
     ASSERT_EQ(Member(describe, &root, 1, OCI_HTYPE_DESCRIBE), 0);
     auto* const columns = Attribute<dvoid*>(root, OCI_DTYPE_PARAM, OCI_ATTR_LIST_COLUMNS);
-    ASSERT_EQ(OCIDescriptorAlloc(env_, &again, OCI_DTYPE_PARAM, 0, nullptr), OCI_SUCCESS);
+    ASSERT_EQ(OCIDescriptorAlloc(env_, &again, OCI_DTYPE_PARAM, 8, &memory), OCI_SUCCESS);
+    EXPECT_EQ(Attribute<dvoid*>(again, OCI_DTYPE_PARAM, OCI_ATTR_USER_MEMORY), memory);
+    EXPECT_EQ(Attribute<OCIEnv*>(again, OCI_DTYPE_PARAM, OCI_ATTR_ENV), env_);
     EXPECT_EQ(Member(again, &again, 1), 24334) << "of nothing";
     MUST(Run(svc_, "drop view v"), Run(svc_, "drop table t"));
     EXPECT_EQ(Name(root, OCI_ATTR_OBJ_NAME), "T") << "as it was";

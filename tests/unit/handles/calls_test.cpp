@@ -1,10 +1,11 @@
-// Calls with pointers that are no handles, with passwords that are too long, and with a handle where another one was.
+// Calls with pointers that are no handles, and with a handle where another one was.
 #include <array>
 #include <cstdlib>
 #include <map>
 #include <utility>
 #include <vector>
 
+#include "oci_legacy.h"
 #include "support/call_fixture.h"
 #include "support/own_memory.h"
 
@@ -33,6 +34,9 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
         auto* svc = static_cast<OCISvcCtx*>(bad);
         auto* buf = reinterpret_cast<OraText*>(text);
         OCISvcCtx* svc_out = nullptr;
+        OCIString* copy = nullptr;
+        OCIRaw* raw = nullptr;
+        Lda_Def login{};
         const sword refused[] = {
             OCIHandleAlloc(bad, &out, OCI_HTYPE_STMT, 0, nullptr),
             OCIHandleFree(bad, OCI_HTYPE_STMT),
@@ -60,25 +64,24 @@ TEST_F(CallsTest, PointersThatAreNoHandlesAreRefusedUnread) {
             OCIPasswordChange(svc, err_, buf, 2, buf, 2, buf, 2, 0),
             OCIServerVersion(bad, err_, buf, 15, OCI_HTYPE_SVCCTX),
             OCIServerVersion(other, err_, buf, 15, OCI_HTYPE_TRANS),
-            OCIServerVersion(server, err, buf, 15, OCI_HTYPE_SERVER)};
+            OCIServerVersion(server, err, buf, 15, OCI_HTYPE_SERVER),
+            OCISessionGet(env_, err, &svc_out, nullptr, buf, 1, nullptr, 0, nullptr, nullptr, nullptr, 0),
+            OCISessionGet(env_, err_, &svc_out, static_cast<OCIAuthInfo*>(bad ? bad : other), buf, 1, nullptr, 0,
+                          nullptr, nullptr, nullptr, 0),
+            OCISessionRelease(svc, err_, nullptr, 0, 0),
+            OCISessionPoolDestroy(static_cast<OCISPool*>(bad), err_, 0),
+            OCIConnectionPoolDestroy(static_cast<OCICPool*>(bad), err_, 0),
+            OCITransStart(svc, err_, 0, OCI_TRANS_NEW),
+            OCITransMultiPrepare(svc, 1, reinterpret_cast<OCITrans**>(&other), &err_),
+            OCIDescribeAny(svc, err_, buf, 1, OCI_OTYPE_NAME, 0, OCI_PTYPE_TABLE, static_cast<OCIDescribe*>(bad)),
+            OCIParamGet(bad, OCI_DTYPE_PARAM, err_, &out, 1),
+            OCISvcCtxToLda(svc, err_, &login),
+            OCIStringAssign(env_, err_, static_cast<OCIString*>(bad ? bad : other), &copy),
+            OCIRawAssignRaw(env_, err_, static_cast<OCIRaw*>(bad ? bad : other), &raw)};
         for (std::size_t call = 0; call < std::size(refused); ++call)
             EXPECT_EQ(refused[call], OCI_INVALID_HANDLE) << call;
         EXPECT_EQ(FirstCode(err_), 0) << "no record";
     }
-}
-
-// A password that is too long is found out when the session has begun, which does not stay.
-TEST_F(CallsTest, PasswordsThatAreTooLong) {
-    OCISvcCtx *svc = nullptr, *other = New<OCISvcCtx>(OCI_HTYPE_SVCCTX);
-    auto* server = New<OCIServer>(OCI_HTYPE_SERVER);
-    ASSERT_EQ(LogOn(&svc, "test", "zoe", "one"), 0);
-    ASSERT_EQ(Answer(OCIServerAttach(server, err_, Text("test"), 4, 0)), 0);
-    ASSERT_EQ(Answer(OCIAttrSet(other, OCI_HTYPE_SVCCTX, server, 0, OCI_ATTR_SERVER, err_)), 0);
-    const std::string longer(1000, 'x');
-    EXPECT_EQ(Answer(OCIPasswordChange(other, err_, Text("zoe"), 3, Text("one"), 3, Text(longer.c_str()), 1000,
-                                       OCI_AUTH)), 1017);
-    EXPECT_EQ(Answer(OCIPing(other, err_, 0)), 1012);
-    EXPECT_EQ(Answer(OCILogoff(svc, err_)), 0);
 }
 
 // Gives freed blocks out again, the last one first.

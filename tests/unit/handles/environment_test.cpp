@@ -61,7 +61,7 @@ TEST(ErrorLists, KeepWhatIsAdded) {
 TEST(TextIn, EndsAtAZeroOrItsLength) {
     const struct { std::uint32_t mode; std::string_view text; const char* read; } cases[] = {
         {OCI_DEFAULT, {"ab\0c", 4}, "ab"}, {OCI_DEFAULT, "ab\1c", "ab\1c"}, {OCI_DEFAULT, {"\0a", 2}, ""},
-        {OCI_UTF16, {"a\0b\0\0\0c\0", 8}, "ab"}, {OCI_UTF16, {"\0\1a\0", 4}, "\xC4\x80""a"},
+        {OCI_UTF16, {"a\0b\0\0\0", 6}, "ab"}, {OCI_UTF16, {"\0\1a\0", 4}, "\xC4\x80""a"},
         {OCI_UTF16, {"\0\0a\0", 4}, ""}, {OCI_UTF16, {"a\0b\0", 4}, "ab"}};
     for (const auto& c : cases) {
         Environment* const environment = Environment::Open(c.mode, Environment::SetsOf(c.mode), {}, 0);
