@@ -42,6 +42,8 @@ protected:
     static sb4 Code(int rmid = 1) {
         SQLCA diagnostics{};
         EXPECT_EQ(XaGetInfo(rmid, &diagnostics), XA_OK);
+        EXPECT_EQ(std::string(diagnostics.sqlcaid, 8) + std::string(diagnostics.sqlwarn, 11), "SQLCA" + std::string(14, ' '));
+        EXPECT_EQ(diagnostics.sqlcabc, 136);
         return diagnostics.sqlcode;
     }
 
