@@ -310,12 +310,11 @@ sword Execute(Cda_Def* area) {
 
 sword ExecuteRows(Cda_Def* area, sword iterations, sword first) {
     return OnRunningStatement(area, Function::oexec, [iterations, first](Cursor& cursor, Cda_Def& fields) -> int {
-        const bool some = first >= 0 && iterations > first;
-        if (!some && !cursor.is_query) {
+        if (!cursor.is_query && (first < 0 || iterations <= first)) {
             fields.rpc = 0;
             return errors::kNoIterations;
         }
-        return Run(cursor, fields, some ? static_cast<ub4>(iterations) : 1, some ? static_cast<ub4>(first) : 0);
+        return Run(cursor, fields, static_cast<ub4>(iterations), static_cast<ub4>(first));
     });
 }
 

@@ -16,7 +16,6 @@ std::atomic<bool> threads{false};
 
 // False for a length that is none.
 bool Read(TextArgument argument, std::string_view& out) {
-    out = {};
     if (argument.length < -1) return false;
     if (!argument.begin) return true;
     const auto* const begin = reinterpret_cast<const char*>(argument.begin);

@@ -58,9 +58,8 @@ int Bind(Cursor& cursor, Name name, Place place, Table table, const Steps* steps
     if (const int failed = Prepare(place, steps, OCI_DATA_AT_EXEC, mode)) return failed;
     OCIBind* bind = nullptr;
     const int result = Outcome(OCIBindByName(cursor.statement, &bind, cursor.error, name.begin, name.length,
-                                             mode == OCI_DEFAULT ? place.value : nullptr, place.length,
-                                             static_cast<ub2>(place.type), place.indicator, place.lengths, place.codes,
-                                             table.most, table.current, mode),
+                                             place.value, place.length, static_cast<ub2>(place.type), place.indicator,
+                                             place.lengths, place.codes, table.most, table.current, mode),
                                cursor);
     return result != 0 ? result : Finish(cursor, bind, OCI_HTYPE_BIND, place, steps, OCIBindArrayOfStruct);
 }
@@ -75,9 +74,8 @@ int DefineColumn(Cursor& cursor, sword position, Place place, const Steps* steps
     if (const int failed = Prepare(place, steps, OCI_DYNAMIC_FETCH, mode)) return failed;
     OCIDefine* define = nullptr;
     const int result = Outcome(OCIDefineByPos(cursor.statement, &define, cursor.error, static_cast<ub4>(position),
-                                              mode == OCI_DEFAULT ? place.value : nullptr, place.length,
-                                              static_cast<ub2>(place.type), place.indicator, place.lengths, place.codes,
-                                              mode),
+                                              place.value, place.length, static_cast<ub2>(place.type), place.indicator,
+                                              place.lengths, place.codes, mode),
                                cursor);
     if (result != 0) return result;
     cursor.highest_define = std::max(cursor.highest_define, position);

@@ -75,9 +75,6 @@ Status BindRows::Row(std::uint32_t row, std::span<engine::Datum> values) {
         } else if (const int error = Load(slot, row, values[index])) {
             return Error(error);
         }
-        const bool too_narrow = !widened_.empty() && widened_[index] == engine::Kind::decimal;
-        if (too_narrow && values[index].kind == engine::Kind::integer)
-            values::Widen(values[index], slot.bind->workspace);
     }
     return {};
 }

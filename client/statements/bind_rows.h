@@ -18,8 +18,6 @@ class BindRows final : public engine::RowSource {
 public:
     // Finds the binds, unless nothing has changed since it did. Error 1008 when a placeholder has nothing bound to it.
     Status Collect(const BoundText& text, const sql::EngineText& sql);
-    // For engines that are told the kinds beforehand: whole numbers come as decimals where these say so.
-    void WidenTo(std::span<const engine::Kind> kinds) { widened_ = kinds; }
 
     Status Row(std::uint32_t row, std::span<engine::Datum> values) override;
 
@@ -41,5 +39,4 @@ private:
     std::uint32_t collected_ = 0;    // the text's changes when it was; 0: not yet
     std::uint64_t seen_ = 0;         // erased objects when all binds were found living
     bool has_tables_ = false;
-    std::span<const engine::Kind> widened_;
 };

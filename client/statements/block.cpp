@@ -68,7 +68,6 @@ public:
         if (step.verb == SavepointStep::Verb::sets) savepoints_.push_back(std::move(step.name));
         else if (found != savepoints_.rend()) savepoints_.erase(found.base() - releases, savepoints_.end());
         else begun_ = false;
-        if (!begun_) savepoints_.clear();
     }
     // Keeps what is done. Dropping the mark would drop the savepoints behind it, which the application may go back to.
     Status Keep() { return std::exchange(begun_, false) && savepoints_.empty() ? engine_.DropMark() : Status(); }
@@ -277,7 +276,6 @@ void Statement::TakeResult(std::unique_ptr<engine::Query> query, const std::shar
     ++link->open_statements;
     run_.state = Execution::State::executed;
     run_.fetch_error = 0;
-    described_ = true;
 }
 
 void ResultSet::BecomeStatement() {

@@ -16,8 +16,7 @@ void BoundText::Take(std::string&& text, sql::StatementText&& scanned,
 }
 
 bool BoundText::AnyInPieces() const {
-    return std::any_of(bound_.begin(), bound_.end(),
-                       [](const auto& bind) { return bind && bind->InPieces() && bind->HasHandle(); });
+    return std::any_of(bound_.begin(), bound_.end(), [](const auto& bind) { return bind && bind->InPieces(); });
 }
 
 const std::uint32_t* BoundText::FindName(std::string_view written) const {

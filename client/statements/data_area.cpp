@@ -186,12 +186,6 @@ void DataArea::SetOwner(std::shared_ptr<StatementShare> owner) noexcept {
     owner_.swap(owner);
 }
 
-void DataArea::Leave(const StatementShare* owner) noexcept {
-    std::shared_ptr<StatementShare> left;    // goes after the lock
-    const std::lock_guard lock(owner_mutex_);
-    if (owner_.get() == owner) left.swap(owner_);
-}
-
 void ReleaseArea(DataArea& area, const Object& statement) noexcept {
     area.SetOwner(nullptr);
     Object* const handle = area.Handle();

@@ -76,11 +76,9 @@ public:
     [[nodiscard]] dvoid* Pointer() const noexcept { return const_cast<dvoid*>(workspace.holder.load()); }
     [[nodiscard]] TypeCode HandleType() const { return handle_type_; }
 
-    // The statement that the area belongs to; null: none.
+    // The statement that the area belongs to, which may be gone; null: none.
     [[nodiscard]] std::shared_ptr<StatementShare> Owner() const;
     void SetOwner(std::shared_ptr<StatementShare> owner) noexcept;
-    // It no longer belongs to this one, which goes; nothing when it belongs to another.
-    void Leave(const StatementShare* owner) noexcept;
 
     [[nodiscard]] const values::ExternalType* Type() const { return type_; }
     // Whether elements are descriptors of dates, times or intervals.

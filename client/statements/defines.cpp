@@ -24,11 +24,6 @@ void Defines::Retire(const Object& statement) noexcept {
         if (area) area->SetOwner(nullptr);
 }
 
-void Defines::LetLoose(const StatementShare* share) noexcept {
-    for (const auto& area : made_)
-        if (area) area->Leave(share);
-}
-
 bool Defines::AllLive() const {
     return std::all_of(active_.begin(), active_.end(), [](const Active& active) { return active.area->HasHandle(); });
 }

@@ -30,8 +30,6 @@ public:
     void Put(ub4 position, const std::shared_ptr<DataArea>& area, const Object& statement) noexcept;
     // The text changes: handles outlive theirs by one, since applications hand them in again for the next.
     void Retire(const Object& statement) noexcept;
-    // The statement goes: handles belong to nothing any more.
-    void LetLoose(const StatementShare* share) noexcept;
 
     // The columns may be others, or other ones of their kind.
     void Renew() noexcept { changed_ = true; }

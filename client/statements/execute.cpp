@@ -113,7 +113,6 @@ Status Statement::Compile(std::size_t index, Compiled*& compiled) {
     if (compiled->query && kinds == compiled->kinds) return {};
     compiled->query.reset();
     compiled->kinds = std::move(kinds);
-    if (typed) compiled->rows.WidenTo(compiled->kinds);
     std::uint32_t offset = 0;
     Status status = Engine().Compile({compiled->text.sql, EffectOf(Scanned().steps[index]), compiled->kinds},
                                      compiled->query, offset);

@@ -20,9 +20,6 @@ Statement::~Statement() {
     if (share_) share_->Leave();
     if (kept_in) kept_in->Forget(*this);
     Drop();
-    for (std::size_t placeholder = 0; placeholder < text_.Count(); ++placeholder)
-        if (const auto& bind = text_.At(placeholder)) bind->Leave(share_.get());
-    defines_.LetLoose(share_.get());
 }
 
 std::shared_ptr<std::recursive_mutex> Statement::Serial() { return LinkSerial(); }
@@ -71,8 +68,7 @@ void Statement::Rest() noexcept {
 
 StatementCache* Statement::Cache() const {
     const std::shared_ptr<Link>& link = UsedLink();
-    auto* cache = link ? static_cast<StatementCache*>(link->statement_cache.get()) : nullptr;
-    return cache && cache->Capacity() > 0 ? cache : nullptr;
+    return link ? static_cast<StatementCache*>(link->statement_cache.get()) : nullptr;
 }
 
 Status Statement::Prepare(std::string_view text) {

@@ -110,9 +110,8 @@ struct ExternalType {
 int FindType(std::uint16_t code, std::int64_t size, bool may_be_null, const ExternalType*& type, std::uint32_t& area);
 
 // The kind of Datum that an element becomes when it is read, unless it is null. Whole numbers that fit arrive as
-// integers even where this says decimal; Widen makes them decimals for engines that are told kinds beforehand.
+// integers even where this says decimal.
 engine::Kind KindOf(const ExternalType& type, std::uint32_t size);
-void Widen(engine::Datum& datum, Workspace& workspace);
 
 // The row of a table that serves a column.
 template <class Function>

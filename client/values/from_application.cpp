@@ -221,12 +221,6 @@ void SetTimestamp(const date::DateTime& value, Workspace& workspace, Datum& datu
     datum.data = workspace.small.data();
 }
 
-void Widen(Datum& datum, Workspace& workspace) {
-    OCINumber number;
-    number::FromInt64(datum.integer, &number);
-    SetDecimal(number, workspace, datum);
-}
-
 int FromNull(const Source&, Workspace&, Datum&) { return 0; }    // the datum is null as it comes
 int FromNothing(const Source&, Workspace&, Datum&) { return errors::kInconsistentTypes; }
 
