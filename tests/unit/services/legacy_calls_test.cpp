@@ -169,7 +169,8 @@ TEST_F(LegacyCalls, AContextThatLendsItsSessionGoes) {
     const std::size_t slash = user.find('/');
     ASSERT_EQ(OCILogon(env, err, &service, Text(user), static_cast<ub4>(server ? slash : 0), Text("secret"),
                        server ? 6 : 0, Text(database), static_cast<ub4>(database.size())), 0);
-    for (Lda_Def* area : {static_cast<Lda_Def*>(nullptr), &cda, &lda}) EXPECT_EQ(OCISvcCtxToLda(service, err, area), OCI_ERROR);
+    for (const auto& [area, number] : {std::pair{static_cast<Lda_Def*>(nullptr), 21560}, {&cda, 1001}, {&lda, 1015}})
+        EXPECT_EQ(OCISvcCtxToLda(service, err, area) == OCI_ERROR ? FirstCode(err) : 0, number);
     MUST(OCISvcCtxToLda(service, err, &lent), oopen(&cursor, &lent, nullptr, -1, -1, nullptr, -1));
     if (server) {
         MUST(oparse(&cursor, Text("select pg_sleep(0.5)"), -1, 1, 2), onbset(&lent));

@@ -60,6 +60,9 @@ TEST_F(Binds, HostileArguments) {
         for (dvoid* b : pointers)
             for (const ub4 number : {0u, 1u, 2u, 0x7FFFFFFFu, 0x80000000u, 0xFFFFFFFFu}) call(a, b, number);
     EXPECT_GT(refused, 5000);
+    EXPECT_EQ(Answer(OCIBindByName(stmt, null, err, text, 1, area, 8, SQLT_INT, null, null, null, 0, null, 0)), 21560);
+    EXPECT_EQ(Answer(OCIBindByPos(stmt, null, err, 1, area, 8, SQLT_INT, null, null, null, 0, null, 0)), 21560);
+    EXPECT_EQ(Answer(OCIDefineByPos(stmt, null, err, 1, area, 8, SQLT_INT, null, null, null, 0)), 21560);
     ASSERT_EQ(Prepare("select 1 from dual"), 0) << "the statement still works";
     EXPECT_EQ(Execute(0), 0);
 }
@@ -69,7 +72,7 @@ TEST_F(Binds, WideForms) {
     MustRun("create table t(a varchar2(80000))");
     std::string in(140000, 'x'), out(160000, '#');
     ub4 lengths[2] = {70000, 65536}, stored[3] = {9, 9, 9};
-    OCIBind* bind = nullptr;
+    OCIBind *bind = nullptr, *told = nullptr;
     OCIDefine* define = nullptr;
     for (const bool by_name : {true, false}) {
         ASSERT_EQ(Prepare("insert into t values(:1)"), 0);
@@ -82,6 +85,8 @@ TEST_F(Binds, WideForms) {
         EXPECT_EQ(bound(sb8{1} << 32), 1459);
         EXPECT_EQ(bound(-1), 1459);
         MUST(bound(70000), Execute(2));
+        MUST(Answer(OCIStmtGetBindInfo(stmt, err, 1, 1, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, &told)));
+        EXPECT_EQ(told, bind);
     }
     EXPECT_EQ(One("select min(length(a)) || ',' || max(length(a)) || ',' || sum(length(a)) from t"),
               "65536,70000,271072");
@@ -97,7 +102,6 @@ TEST_F(Binds, WideForms) {
     ub4 type = 9;
     EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, &type, OCI_DEFAULT)), 1403);
     EXPECT_EQ(result, nullptr);
-    EXPECT_EQ(OCIStmtGetNextResult(stmt, err, &result, &type, OCI_DEFAULT), OCI_NO_DATA);
     EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, &type, 1)), 24300);
     EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, &result, nullptr, OCI_DEFAULT)), 21560);
     EXPECT_EQ(Answer(OCIStmtGetNextResult(stmt, err, nullptr, &type, OCI_DEFAULT)), 21560);
