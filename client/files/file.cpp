@@ -159,7 +159,6 @@ Status File::Seek(std::uint32_t origin, std::uint64_t offset, int direction) {
             return InvalidArgument("offset too large");
         constexpr int kOrigins[] = {0, SEEK_SET, SEEK_CUR, SEEK_END};
         const auto distance = static_cast<off_t>(offset);
-        last_ = Last::other;
         if (fseeko(stream_, forward ? distance : -distance, kOrigins[origin]) == 0) return {};
         return SystemError(name_, errno);
     });
