@@ -32,8 +32,11 @@ protected:
         return Answer(code);
     }
     sb4 Get(OCISvcCtx** svc, OCIError* err, std::string_view name) const {
-        return Answer(OCISessionGet(env_, err, svc, nullptr, Text(name), static_cast<ub4>(name.size()), nullptr, 0,
-                                    nullptr, nullptr, nullptr, OCI_SESSGET_SPOOL), err);
+        OraText* tag = nullptr;
+        const sword code = OCISessionGet(env_, err, svc, nullptr, Text(name), static_cast<ub4>(name.size()), nullptr, 0,
+                                         &tag, nullptr, nullptr, OCI_SESSGET_SPOOL);
+        EXPECT_EQ(tag, nullptr);
+        return Answer(code, err);
     }
     sb4 Get(OCISvcCtx** svc, OCIError* err) const { return Get(svc, err, name_); }
     sb4 Release(OCISvcCtx* svc, ub4 mode = OCI_DEFAULT) {
