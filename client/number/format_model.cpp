@@ -103,7 +103,6 @@ private:
     }
 
     bool SignElement() {
-        if (model_.sign != Sign::before) return false;
         if (at_ == 1) {
             model_.sign = Sign::leading_s;
             return true;
@@ -146,7 +145,6 @@ bool ParseHexadecimal(std::string_view text, FormatModel* model) {
 }  // namespace
 
 Errno ParseFormat(std::string_view text, FormatModel* model) noexcept {
-    *model = FormatModel{};
     if (letters::StartsWithFolded(text, "FM")) {
         model->fill = false;
         text.remove_prefix(2);

@@ -117,7 +117,7 @@ TEST(ZoneRules, TextsOfRules) {
 TEST(ZoneRules, SmallFiles) {
     const struct { std::uint8_t index, letter; std::int32_t offset; bool read; } cases[] = {
         {1, 0, 3600, true}, {2, 0, 3600, false}, {1, 3, 3600, true}, {1, 4, 3600, false}, {1, 0, 100000, true},
-        {1, 0, 100001, false}, {1, 0, -100000, true}, {1, 0, -100001, false}};
+        {1, 0, 100001, false}, {1, 0, -100000, true}, {1, 0, -100001, false}, {1, 0, 0xFFFFFF, false}};
     for (const auto& c : cases) {
         std::string bytes = "TZif" + std::string(16, '\0');
         const auto put = [&](std::int32_t number) {
