@@ -91,7 +91,7 @@ TEST(ZoneRules, TextsOfRules) {
         {"CET-1CEST,M3.5.0,M10.5.0/3", 1711846800, 7200, "CEST"}, {"EST5EDT", 1710054000, -14400, "EDT"},
         {"AEST-10AEDT,M10.1.0,M4.1.0/3", 1704067200, 39600, "AEDT"},
         {"XXX3YYY2,J59/0,300/0", 1709089199, -10800, "XXX"},  // J59 is 28 February, in leap years too
-        {"XXX3YYY2,J59/0,300/0", 1709089200, -7200, "YYY"},
+        {"XXX3YYY2,J59/0,300/0", 1709089200, -7200, "YYY"}, {"XXX-10YYY,J1/0:15,J100", 1704033000, 39600, "YYY"},
         {"XXX3YYY2,59/0,300/0", 1709175599, -10800, "XXX"},   // 59 is 29 February in leap years
         {"XXX3YYY2,59/0,300/0", 1709175600, -7200, "YYY"}, {"XXX3YYY2,M2.5.6/0,M10.5.6/0", 1708743600, -7200, "YYY"},
         {"XXX3YYY2,J60/0,300/0", 1709218800, -10800, "XXX"},  // J60 is 1 March in leap years, too
