@@ -81,7 +81,7 @@ std::vector<IniSetting> IniText::Settings(std::string_view section) const {
 
 void IniText::Set(std::string_view section, std::string_view key, std::string_view value) {
     for (Line& line : lines_) {
-        if (line.key.empty() || !Same(line.section, section) || !Same(line.key, key)) continue;
+        if (!Same(line.section, section) || !Same(line.key, key)) continue;
         // What stands before the value is kept, blanks behind the equals sign too.
         const std::size_t equals = line.text.find('=');
         const std::size_t start = line.text.find_first_not_of(" \t", equals + 1);
@@ -101,7 +101,7 @@ void IniText::Set(std::string_view section, std::string_view key, std::string_vi
 
 bool IniText::Remove(std::string_view section, std::string_view key) {
     return std::erase_if(lines_, [&](const Line& line) {
-               return !line.key.empty() && Same(line.section, section) && Same(line.key, key);
+               return Same(line.section, section) && Same(line.key, key);
            }) > 0;
 }
 

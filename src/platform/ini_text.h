@@ -16,6 +16,7 @@ public:
     // Each key once, as it is first written, with the value it has there.
     [[nodiscard]] std::vector<IniSetting> Settings(std::string_view section) const;
 
+    // The key of these is not empty: lines that are no settings have an empty one.
     void Set(std::string_view section, std::string_view key, std::string_view value);
     // False when there was none.
     bool Remove(std::string_view section, std::string_view key);

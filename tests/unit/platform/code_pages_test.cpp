@@ -66,7 +66,7 @@ TEST(CodePages, AreasOfEveryLength) {
         {1258, 1202, "xe\xEC" "ae\xEC"}, {1208, 37, "abcé"}, {1208, 819, "a中"},
         {1208, 943, "é中é"}, {1208, 54936, "a\xFFz"},  // substitutes that just fit
         {1208, 1202, "a\xFFz\xE4\xB8"}, {1202, 850, Convert(1208, 1202, "aй中z").output},
-        {1202, 1208, Convert(1208, 1202, "twenty-four letters here").output}, {1255, 1208, "\xE0\xF9\xCC"},
+        {1202, 1208, Convert(1208, 1202, "twenty-four letters here").output}, {1208, 1202, "as many of them"}, {1255, 1208, "\xE0\xF9\xCC"},
     };
     for (const auto& c : cases) {
         const Converted whole = Convert(c.source, c.target, c.input);

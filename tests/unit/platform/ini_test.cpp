@@ -77,7 +77,7 @@ TEST_F(Ini, AWriteChangesOneLine) {
         {"[s]\nk=1\nodd line\nk=2\n[t]\nk=3\n", "s", "K", nullptr, "[s]\nodd line\n[t]\nk=3\n"},
         {"[s]\nk=1\n", "s", "absent", nullptr, "[s]\nk=1\n"}, {"[s]\nk=\n", "s", "k", "v", "[s]\nk=v\n"},
         {"[s]", "s", "k", "v", "[s]\nk=v\n"}, {"[s\nk=1\n", "s", "k", "v", "[s\nk=1\n\n[s]\nk=v\n"},
-        {"[s]\nk=1\n", "s", "k", "", "[s]\nk=\n"}, {"k=0\n[s]\n", "", "k", "1", "k=1\n[s]\n"}};
+        {" [s]\n ;k=0\nk=1\n", "s", "k", "", " [s]\n ;k=0\nk=\n"}, {"k=0\n[s]\n", "", "k", "1", "k=1\n[s]\n"}};
     for (const auto& c : cases) {
         Put(c.before);
         EXPECT_TRUE(Write(c.section, c.key, c.value));

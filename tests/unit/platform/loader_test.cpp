@@ -44,8 +44,9 @@ TEST_F(Loader, AMissingFunctionIsToldAtEachCall) {
     Use(PROBE_PARTIAL_LIBRARY);
     EXPECT_EQ(Call(&ClientLibrary::OCIPing, nullptr, nullptr, 0), OCI_ERROR);
     EXPECT_EQ(Call(&ClientLibrary::OCIPing, nullptr, nullptr, 0), OCI_ERROR);
+    EXPECT_EQ(Call(&ClientLibrary::OCIThreadIsMulti), FALSE);
     const std::string once = "Function OCIPing not found in client library\n";
-    EXPECT_EQ(complaints, once + once);
+    EXPECT_EQ(complaints, once + once + "Function OCIThreadIsMulti not found in client library\n");
     EXPECT_FALSE(Exports(&ClientLibrary::OCIPing));
     EXPECT_TRUE(Exports(&ClientLibrary::OCIBreak));
 }
