@@ -68,6 +68,7 @@ public:
         if (step.verb == SavepointStep::Verb::sets) savepoints_.push_back(std::move(step.name));
         else if (found != savepoints_.rend()) savepoints_.erase(found.base() - releases, savepoints_.end());
         else begun_ = false;
+        if (!begun_) savepoints_.clear();
     }
     // Keeps what is done. Dropping the mark would drop the savepoints behind it, which the application may go back to.
     Status Keep() { return std::exchange(begun_, false) && savepoints_.empty() ? engine_.DropMark() : Status(); }

@@ -16,7 +16,8 @@ void BoundText::Take(std::string&& text, sql::StatementText&& scanned,
 }
 
 bool BoundText::AnyInPieces() const {
-    return std::any_of(bound_.begin(), bound_.end(), [](const auto& bind) { return bind && bind->InPieces(); });
+    return std::any_of(bound_.begin(), bound_.end(),
+                       [](const auto& bind) { return bind && bind->InPieces() && bind->HasHandle(); });
 }
 
 const std::uint32_t* BoundText::FindName(std::string_view written) const {

@@ -68,7 +68,8 @@ void Statement::Rest() noexcept {
 
 StatementCache* Statement::Cache() const {
     const std::shared_ptr<Link>& link = UsedLink();
-    return link ? static_cast<StatementCache*>(link->statement_cache.get()) : nullptr;
+    auto* cache = link ? static_cast<StatementCache*>(link->statement_cache.get()) : nullptr;
+    return cache && cache->Capacity() > 0 ? cache : nullptr;
 }
 
 Status Statement::Prepare(std::string_view text) {

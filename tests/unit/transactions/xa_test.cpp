@@ -42,8 +42,8 @@ protected:
     static sb4 Code(int rmid = 1) {
         SQLCA diagnostics{};
         EXPECT_EQ(XaGetInfo(rmid, &diagnostics), XA_OK);
-        EXPECT_EQ(std::string(diagnostics.sqlcaid, 8) + diagnostics.sqlerrp[7] + std::string(diagnostics.sqlwarn, 11) +
-                  std::to_string(diagnostics.sqlcabc), "SQLCA" + std::string(15, ' ') + "136");
+        EXPECT_EQ(std::string(diagnostics.sqlcaid, 8) + std::string(diagnostics.sqlwarn, 11) +
+                  std::to_string(diagnostics.sqlcabc), "SQLCA" + std::string(14, ' ') + "136");
         return diagnostics.sqlcode;
     }
 
