@@ -339,7 +339,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         const bool was_in_transaction = connection_.InTransaction();
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
         Batch batch;
-        const bool whole = row >= singly && row < stop && !delivers && stop == run.last && PrepareWhole(run.last - row);
+        const bool whole = row >= singly && !delivers && stop == run.last && PrepareWhole(run.last - row);
         if (was_in_transaction && !connection_.InTransaction()) return server.Broken() ? server.Lost() : connection_.Loss();
         if (whole) {
             batch = TryWhole(source, row, run.last);

@@ -205,7 +205,7 @@ TEST_F(Postgres, ValuesAtTheirLimits) {
         {"%1::timestamp", Moment(ides), "0044-03-29 12:00:00 BC;"}, {"%1::timestamp", Moment(none), "error 1839"},
         {"%1::timestamp", Moment(julian), "error 1839"}, {"%1::pg_catalog.date", Moment(leap), "2024-02-29;"},
         {"%1::timestamptz at time zone 'UTC'", Moment(zoned), "2024-02-29 06:30:00;"},
-        {"pg_typeof(%1)", Moment(leap), "timestamp without time zone;"},
+        {"pg_typeof(%1)", Moment(leap), "timestamp without time zone;"}, {"pg_typeof(%1)", Text("x"), "text;"}, {"pg_typeof(%1)", Null(), "text;"},
         {"%1::timestamp", Text("29-FEB-24 01.02.03.5 PM"), "2024-02-29 13:02:03.5;"},
         {"%1::timestamp", Text("2024-02-29 13:02:03"), "2024-02-29 13:02:03;"},
         {"%1::timestamp", Text("29-FEB-24 x"), "error 1830"}, {"%1::interval", Text("1-2"), "1-2;"},
