@@ -283,7 +283,7 @@ private:
     // One statement of a block; false when the library does not know such a one.
     bool BlockStatement(std::size_t first, std::size_t last) {
         const Token& verb = tokens_[first];
-        if (verb.Is("null") && first + 1 == last) return AddTargeted(Run::nothing, first, last, last);
+        if (verb.Is("null") && first + 1 == last) return AddStep(Run::nothing, last, last), true;
         if (verb.Is("open") && At(tokens_, first + 1).kind == TokenKind::placeholder &&
             At(tokens_, first + 2).Is("for")) {
             const Leading* row = Decisive(first + 3);
@@ -299,9 +299,9 @@ private:
 
     // A step over tokens [first, last) whose result goes to the placeholder at `target`.
     bool AddTargeted(Run run, std::size_t target, std::size_t first, std::size_t last) {
-        if (run != Run::nothing && first >= last) return false;
+        if (first >= last) return false;
         AddStep(run, first, last);
-        if (run != Run::nothing) result_.steps.back().targets = {PlaceholderAt(tokens_[target])};
+        result_.steps.back().targets = {PlaceholderAt(tokens_[target])};
         return true;
     }
 
