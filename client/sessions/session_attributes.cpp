@@ -18,7 +18,7 @@ Status GetSchema(Session& session, AttributeValue& value) {
     Status status = session.GetSchema(schema);
     std::string& kept = session.KeptText(OCI_ATTR_CURRENT_SCHEMA);
     value.text = TextOut(session.Env(), schema, kept);
-    if (!session.Env().Utf16()) value.text = kept = std::move(schema);
+    if (!session.Env().Converts()) value.text = kept = std::move(schema);
     value.converted = true;
     return status;
 }

@@ -118,6 +118,9 @@ TEST_F(NlsCalls, StatementsSpeakTheSetOfTheirEnvironment) {
     const auto set = [&](dvoid* handle, ub4 type, ub4 attribute, auto value) {
         return Answer(OCIAttrSet(handle, type, &value, 0, attribute, err_));
     };
+    auto* const session = New<OCISession>(OCI_HTYPE_SESSION);
+    MUST(Answer(OCIAttrSet(session, OCI_HTYPE_SESSION, const_cast<char*>("\xe4"), 1, OCI_ATTR_CURRENT_SCHEMA, err_)));
+    EXPECT_STREQ(Attribute<const char*>(session, OCI_HTYPE_SESSION, OCI_ATTR_CURRENT_SCHEMA), "\xe4");
     // What is bound and read back: in the environment's own set, in the national one, in one that is told.
     const struct { ub1 form; ub2 set; std::string_view in, out; } cases[] = {
         {SQLCS_IMPLICIT, 0, "\x80", "\xe9\x80  "}, {SQLCS_NCHAR, 0, "\xc4", "\xe9?  "},
