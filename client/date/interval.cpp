@@ -48,13 +48,10 @@ Errno Check(const Part (&parts)[count]) {
     return above && below ? errors::kBadInterval : 0;
 }
 
-// Digits from the right, at least as many as asked for.
-char* PutDigits(std::int64_t number, unsigned least, char* at) {
-    char digits[20];
-    unsigned count = 0;
-    for (; number > 0 || count < least; number /= 10) digits[count++] = static_cast<char>('0' + number % 10);
-    while (count > 0) *at++ = digits[--count];
-    return at;
+// The last `count` digits of a number.
+char* PutDigits(std::int64_t number, unsigned count, char* at) {
+    for (unsigned place = count; place-- > 0; number /= 10) at[place] = static_cast<char>('0' + number % 10);
+    return at + count;
 }
 
 class Reader {
@@ -204,7 +201,7 @@ Errno ToText(const Interval& value, unsigned leading, unsigned fraction, char* t
         std::int64_t digits = parts.nanosecond;
         for (unsigned place = fraction; place < kMostDigits; ++place) digits /= 10;
         if (fraction > 0) *at++ = '.';
-        if (fraction > 0) at = PutDigits(digits, fraction, at);
+        at = PutDigits(digits, fraction, at);
     }
     *length = static_cast<std::size_t>(at - text);
     return 0;

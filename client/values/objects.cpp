@@ -107,14 +107,12 @@ int PutDatetime(const date::DateTime& value, Workspace&, Target& target) {
     return descriptor->Store(value).Number();
 }
 
-// A descriptor without a date gives the time alone.
+// A descriptor without a date holds the time alone.
 int FromDatetime(const Source& source, Workspace& workspace, Datum& datum) {
     const auto* descriptor = Live<DateTimeDescriptor>(PointerAt(source.at));
     if (!descriptor) return errors::kBadObject;
     if (!descriptor->IsSet()) return errors::kInvalidDateTime;
-    date::DateTime value = descriptor->Value();
-    if (!descriptor->HasDate()) value.year = 0, value.month = value.day = 0;
-    SetTimestamp(value, workspace, datum);
+    SetTimestamp(descriptor->Value(), workspace, datum);
     return 0;
 }
 

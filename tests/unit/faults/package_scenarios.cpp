@@ -144,7 +144,7 @@ OCIRaw*& NewRaw(World& w) {
     return raw;
 }
 
-SCENARIO(Raws, environment, nullptr, "100;") {
+SCENARIO(Raws, environment, nullptr, "2100;") {
     OCIRaw *&raw = NewRaw(w), *&copy = NewRaw(w);
     const ub1 bytes[100] = {1, 2, 3};
     w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 3, &raw);
@@ -152,8 +152,10 @@ SCENARIO(Raws, environment, nullptr, "100;") {
         w.STEP(OCIRawAssignBytes, w.env, w.err, bytes, 100, &raw);
         w.STEP(OCIRawResize, w.env, w.err, 2000, &raw);
     }, [&] { EXPECT_EQ(OCIRawPtr(w.env, raw)[2], 3); });
+    ub4 room = 0;
+    w.STEP(OCIRawAllocSize, w.env, w.err, raw, &room);
     w.STEP(OCIRawAssignRaw, w.env, w.err, raw, &copy);
-    w.See(OCIRawSize(w.env, copy));
+    w.See(OCIRawSize(w.env, copy) + room);
 }
 
 // ---- Files and threads
