@@ -171,7 +171,7 @@ void ToPlaces(sqlite3_context* context, int count, Arguments arguments) {
     std::int64_t places = 0;
     int failure = ReadNumber(arguments[0], number);
     if (failure == 0 && count > 1) failure = ReadWhole(arguments[1], places);
-    constexpr std::int64_t kMostPlaces = 130;
+    constexpr std::int64_t kMostPlaces = 1000;    // beyond any place that a number has
     places = std::clamp(places, -kMostPlaces, kMostPlaces);
     if (failure == 0) failure = operation(number, static_cast<int>(places), &number);
     if (failure != 0) return Refuse(context, failure);
