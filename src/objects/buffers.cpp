@@ -61,7 +61,6 @@ void BeginRecord(MemBuffer& buffer, void* statement, const ElementShape& shape, 
     buffer.scale = shape.scale;
     buffer.array_size = array_size;
     buffer.dynamic = {};
-    buffer.holds_pointers = false;
     buffer.current_element = 0;
 }
 
@@ -161,7 +160,6 @@ int AllocateBuffer(MemBuffer& buffer, void* statement, const ElementShape& shape
     if (!ObtainBlocks(buffer)) return -1;
     SetCallPointers(buffer);
     InitialiseNumbers(buffer, shape);
-    buffer.holds_pointers = HoldsPointers(shape.type);
     return 0;
 }
 
@@ -174,7 +172,6 @@ void ShowAsBuffer(MemBuffer& buffer, void* statement, const ElementShape& shape,
     buffer.lengths = places.length;
     buffer.return_codes = places.return_code;
     SetCallPointers(buffer);
-    buffer.holds_pointers = HoldsPointers(shape.type);
 }
 
 void FreeBufferBlocks(MemBuffer& buffer) {

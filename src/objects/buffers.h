@@ -45,7 +45,6 @@ struct MemBuffer {
     uint16_t* call_return_codes;
     uint32_t array_size;
     char name[36];
-    bool holds_pointers;        // elements are locators, descriptors or handles
     uint32_t current_element;   // of PL/SQL arrays: the count that calls read and write
     DynamicData dynamic;
 

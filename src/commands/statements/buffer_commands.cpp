@@ -134,8 +134,8 @@ void ListBuffers(const CommandRow&, int count, char** words) {
         if (!buffer.in_use || buffer.statement != statement) continue;
         if (name != nullptr && !HasName(buffer, name)) continue;
         if (output && buffer.lengths != nullptr) buffer.lengths[0] = FieldOfLength(buffer.element_size);
-        line.Format("[%s]  %s  %d  %d  ", buffer.name, statement_name,
-                    static_cast<int>(buffer.holds_pointers ? 8 : buffer.element_size), buffer.created_type);
+        line.Format("[%s]  %s  %d  %d  ", buffer.name, statement_name, static_cast<int>(buffer.element_size),
+                    buffer.created_type);
         ListElements(line, buffer);
     }
 }
