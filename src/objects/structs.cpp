@@ -42,16 +42,13 @@ DataTarget TargetOf(MemStruct& record, StructMember& member) {
 
 // --- Layout ----------------------------------------------------------------------------------------------------------
 
+// Of what needs more than the even places that all members lie at.
 uint32_t AlignmentOf(const ElementShape& shape) {
     constexpr uint32_t kPointer = 8;
     switch (shape.type) {
         case SQLT_INT:
         case SQLT_UIN:
         case SQLT_FLT: return std::min(std::bit_floor(std::max(shape.size, 1u)), kPointer);
-        case SQLT_VCS:
-        case SQLT_VBI:
-        case SQLT_AVC:
-        case SQLT_ODT: return 2;
         case SQLT_LVC: return 4;
         case SQLT_BFLOAT:
         case SQLT_BDOUBLE:
