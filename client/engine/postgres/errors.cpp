@@ -192,7 +192,8 @@ Status Failure(const PGresult* result, Verb verb) noexcept {
     if (words.starts_with(kErrorMark)) {
         const std::string_view told = words.substr(kErrorMark.size());
         const std::size_t blank = told.find(' ');
-        return Refused(std::atoi(told.data()), blank == std::string_view::npos ? "" : told.substr(blank + 1));
+        const int number = std::atoi(told.data());
+        if (number > 0) return Refused(number, blank == std::string_view::npos ? "" : told.substr(blank + 1));
     }
     return Refused(NumberOf(Field(result, PG_DIAG_SQLSTATE), words, verb), words);
 }
