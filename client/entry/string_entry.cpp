@@ -24,8 +24,8 @@ sword ChangeAt(OCIEnv* env, OCIError* err, Handle** place, Change change) {
             T* object = Live<T>(*place);
             return object ? change(*object) : InvalidHandle();
         }
-        Made<T> made(Create<T>(environment, 0, 0));
-        Status changed = change(*made);
+        Status changed;
+        Made<T> made(Create<T>(environment, 0, 0, change, changed));
         if (changed.Ok()) *place = AsHandle<Handle>(made.release());
         return changed;
     });

@@ -13,6 +13,9 @@
 class Variable : public Object {
 public:
     explicit Variable(const Origin& origin) : Object(origin) {}
+    // With what a first change(variable) makes of it, before any thread can find it, behind an old pointer either.
+    template <class Change>
+    Variable(const Origin& origin, const Change& change, Status& outcome) : Object(origin) { outcome = change(*this); }
     ~Variable() override;
 
     // Two zeros follow the content, for those who read texts to their end. Valid until the next change.
