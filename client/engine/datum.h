@@ -23,7 +23,8 @@ enum class Kind : std::uint8_t {
     timestamp,  // date, time, fraction, zone: a date::DateTime at `data`; dates arrive so, too
     lob,        // a large object: its locator, `length` bytes at `data`; going in the object itself (lobs.h)
     row_id,     // a RowId at `data`
-    cursor      // a result set, `length` bytes at `data`: it goes nowhere
+    cursor,     // a result set, `length` bytes at `data`: it goes nowhere
+    moment      // of a placeholder's kind alone: timestamps that go with their zones
 };
 constexpr std::size_t kKinds = static_cast<std::size_t>(Kind::cursor) + 1;
 

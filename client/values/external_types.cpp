@@ -145,7 +145,8 @@ engine::Kind KindOf(const ExternalType& type, std::uint32_t size) {
         case Family::integer:
             return type.code == SQLT_UIN && size == sizeof(std::uint64_t) ? engine::Kind::decimal : engine::Kind::integer;
         case Family::real: return engine::Kind::real;
-        case Family::date: return engine::Kind::timestamp;
+        case Family::date:
+            return type.code == SQLT_TIMESTAMP_TZ || type.code == SQLT_TIMESTAMP_LTZ ? engine::Kind::moment : engine::Kind::timestamp;
         case Family::row_id: return engine::Kind::row_id;
         case Family::lob: return type.code == SQLT_BLOB ? engine::Kind::bytes : engine::Kind::text;
         case Family::cursor: return engine::Kind::cursor;

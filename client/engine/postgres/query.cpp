@@ -41,6 +41,11 @@ std::uint32_t OffsetOf(std::string_view text, const char* position) {
     return static_cast<std::uint32_t>(at);
 }
 
+// What a placeholder of dates is where no column tells; 0: it is of none.
+Oid TimeOf(Kind kind) {
+    return kind == Kind::timestamp ? oid::kTimestamp : kind == Kind::moment ? oid::kMoment : 0;
+}
+
 Status NoMemory() { return Refused(errors::kOutOfMemory); }
 
 // Whether two more failures can be noted: one, and that there is no room for others.
@@ -78,9 +83,9 @@ bool PgQuery::RetypesTimes(std::vector<Oid>& types) const {
     bool any = false;
     types = bound_.Types();
     for (std::size_t index = 0; index < kinds_.size(); ++index) {
-        const bool misread = kinds_[index] == Kind::timestamp && types[index] != oid::kTimestamp &&
-                             types[index] != oid::kMoment;
-        types[index] = misread ? oid::kTimestamp : TypeOf(kinds_[index]);
+        const Oid time = TimeOf(kinds_[index]);
+        const bool misread = time != 0 && types[index] != oid::kTimestamp && types[index] != oid::kMoment;
+        types[index] = misread ? time : TypeOf(kinds_[index]);
         any = any || misread;
     }
     return any;
@@ -147,7 +152,7 @@ Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
     if (status.Number() == errors::kInconsistentTypes) {    // a type that nothing tells
         std::vector<Oid> told = types;
         for (std::size_t index = 0; index < told.size(); ++index) {
-            if (told[index] == 0) told[index] = kinds_[index] == Kind::timestamp ? oid::kTimestamp : oid::kText;
+            if (const Oid time = TimeOf(kinds_[index]); told[index] == 0) told[index] = time != 0 ? time : oid::kText;
         }
         if (told == types) return status;
         Status again = PrepareAs(told, error_offset);

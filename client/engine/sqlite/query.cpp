@@ -195,7 +195,8 @@ Status SqliteQuery::Bind(int index, const Datum& value, bool copy) {
             break;
         }
         case Kind::lob: code = sqlite3_bind_zeroblob64(statement, index, objects_.LengthOf(value)); break;
-        case Kind::cursor: return Error(errors::kInconsistentTypes);
+        case Kind::cursor:
+        case Kind::moment: return Error(errors::kInconsistentTypes);
     }
     return code == SQLITE_OK ? Status() : Failure(connection_.Database(), code);
 }
