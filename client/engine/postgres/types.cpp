@@ -338,6 +338,10 @@ void DescribeColumn(Oid type, int modifier, std::string_view domain, Column& col
         {oid::kOid, kObjectDomain, SQLT_BLOB, kLocatorSize, false},
     };
     DescribeType(type, modifier, column);
+    if (type == oid::kTimestamp && modifier == 0 && domain != "date") {    // declared by itself
+        column.type = SQLT_TIMESTAMP;
+        column.size = kTimestampSize;
+    }
     if (type == oid::kInterval && domain == "year_month") return DescribeSpan(SQLT_INTERVAL_YM, 0, column);
     for (const auto& row : kColumns) {
         if (row.type != type || row.domain != domain) continue;
