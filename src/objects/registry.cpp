@@ -162,9 +162,10 @@ bool FindObject(Kind kind, const char* name, void*& object) {
 
 void* ResolveErrorObject(const char* name) {
     if (IsInvalid(name)) return InvalidObject();
-    if (const NamedObject* slot = FindByName(Kind::error, name)) return slot->object;
+    void* object = nullptr;
+    if (FindObject(Kind::error, name, object)) return object;
     for (size_t kind = 0; kind < kHandleKinds; ++kind)
-        if (const NamedObject* slot = FindByName(static_cast<Kind>(kind), name)) return slot->object;
+        if (FindObject(static_cast<Kind>(kind), name, object)) return object;
     if (!IsNull(name)) ComplainNotFound(name);
     return nullptr;
 }
