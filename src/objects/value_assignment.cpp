@@ -279,11 +279,12 @@ const TypeAssignment* FindAssignment(int type) {
     return row == std::end(kTypeAssignments) ? nullptr : row;
 }
 
-// `length` bytes of the word, zeros for those beyond its end; no more than an element's length field can tell.
-std::string Cut(const char* word, long length) {
-    constexpr long kMost = std::numeric_limits<uint16_t>::max();
+// `length` bytes of the word, zeros for those beyond its end as far as an element takes them.
+std::string Cut(const char* word, long length, uint32_t room) {
+    constexpr size_t kLeast = std::numeric_limits<uint16_t>::max();
     std::string text(word);
-    text.resize(static_cast<size_t>(std::clamp(length, 0L, kMost)));
+    const size_t most = std::max({kLeast, text.size(), size_t{room}});
+    text.resize(std::min(static_cast<size_t>(std::max(length, 0L)), most));
     return text;
 }
 
@@ -309,7 +310,7 @@ bool AssignText(const ElementTarget& target, const char* word, long length) {
         return true;
     }
     const TypeAssignment* row = FindAssignment(target.type);
-    Value value{word, Cut(word, length)};
+    Value value{word, Cut(word, length, target.size)};
     if (row != nullptr && row->characters && Utf16Mode && !ConvertToUtf16(value.text)) return false;
     const Stored stored = row == nullptr ? std::nullopt : row->assign(target, value);
     if (!stored) {
