@@ -14,7 +14,6 @@
 #include "objects/memory.h"
 #include "platform/client_library.h"
 #include "platform/code_page.h"
-#include "platform/utf.h"
 #include "report/trace.h"
 
 namespace {
@@ -83,23 +82,29 @@ sb4 TakePiece(void*, const void* data, ub4 length, ub1 piece) {
     return PrintPiece(line, read_context, data, data == nullptr ? 0 : length) ? OCI_CONTINUE : OCI_ERROR;
 }
 
-// The bytes of the area that `amount` UTF-8 characters take. The area was zeros before: where the amount counts bytes,
-// the text ends before it.
-size_t Utf8Length(const char* area, size_t size, ub4 amount) {
-    while (size > 0 && area[size - 1] == '\0') --size;
+// A character of UTF-8 goes on at its second byte and those behind it, one of UTF-16 at the second of a pair.
+bool GoesOn(const char* unit, size_t width) {
+    const auto leading = static_cast<unsigned char>(unit[width - 1]);
+    return width == 1 ? (leading & 0xC0) == 0x80 : (leading & 0xFC) == 0xDC;
+}
+
+// The bytes of the area that `amount` characters take, of UTF-8 or, two bytes wide, of UTF-16. The area was zeros before:
+// where the amount counts bytes, the text ends before it.
+size_t TextLength(const char* area, size_t size, ub4 amount, size_t width) {
+    size -= size % width;
+    while (size > 0 && std::count(area + size - width, area + size, '\0') == static_cast<ptrdiff_t>(width)) size -= width;
     size_t position = 0;
     for (ub4 characters = 0; position < size && characters < amount; ++characters)
-        do ++position;
-        while (position < size && (static_cast<unsigned char>(area[position]) & 0xC0) == 0x80);
+        do position += width;
+        while (position < size && GoesOn(area + position, width));
     return position;
 }
 
 // How much of the area a read has filled: the library counts bytes of binary data, characters of others or, of pieces,
 // bytes again.
 size_t FilledLength(const ReadContext& context, const char* area, size_t size, ub4 amount) {
-    if (context.type != SQLT_BLOB && context.set.IsUtf16())
-        return utf::Utf16Length(area, static_cast<size_t>(std::min<uint64_t>(size, 2 * uint64_t{amount})));
-    if (context.type != SQLT_BLOB && application_code_page == kCodePageUtf8) return Utf8Length(area, size, amount);
+    if (context.type != SQLT_BLOB && context.set.IsUtf16()) return TextLength(area, size, amount, sizeof(char16_t));
+    if (context.type != SQLT_BLOB && application_code_page == kCodePageUtf8) return TextLength(area, size, amount, 1);
     return std::min<size_t>(amount, size);
 }
 
