@@ -150,7 +150,7 @@ private:
 void RunFromInt(const CommandRow& row, int count, char** words) {
     OCIError* const error = ResolveError<OCIError>(words[1]);
     const int width = DecodeNumber(words[3]);
-    const int sign = DecodeKeyword(words[4], NumberSignKeywords);
+    const int sign = DecodeKeywordOrNumber(words[4], NumberSignKeywords);
     Integer integer(width, sign == OCI_NUMBER_SIGNED);
     integer.Read(words[2]);
     const void* const value = IsNull(words[2]) ? nullptr : integer.Pointer();
@@ -167,7 +167,7 @@ void RunToInt(const CommandRow& row, int count, char** words) {
     if (!operand.Resolve(words[2], error)) return;
     const OCINumber* const number = count == 6 && IsNull(words[5]) ? nullptr : operand.Argument();
     const int width = DecodeNumber(words[3]);
-    const int sign = DecodeKeyword(words[4], NumberSignKeywords);
+    const int sign = DecodeKeywordOrNumber(words[4], NumberSignKeywords);
     Integer integer(width, sign == OCI_NUMBER_SIGNED);
     const sword rc = Call(&ClientLibrary::OCINumberToInt, error.Get(), number, static_cast<uword>(width),
                           static_cast<uword>(sign), integer.Pointer());
