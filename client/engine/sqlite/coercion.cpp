@@ -293,8 +293,8 @@ Status Coercion::ApplySize(const Datum& value) {
     if (!has_length || most == 0 || value.length <= most) return {};
     const std::int64_t actual = column_.characters > 0 ? CharacterCount(value.Text()) : value.length;
     if (actual <= most) return {};
-    return Error(errors::kTooLarge,
-                 "column " + column_.name + ", actual " + std::to_string(actual) + ", maximum " + std::to_string(most));
+    const std::string place = column_.name.empty() ? "" : "column " + column_.name + ", ";
+    return Error(errors::kTooLarge, place + "actual " + std::to_string(actual) + ", maximum " + std::to_string(most));
 }
 
 Status Coercion::ApplyDate(Datum& value) {

@@ -112,6 +112,14 @@ void ToText(sqlite3_context* context, int count, Arguments arguments) {
     sqlite3_result_text(context, text.data(), static_cast<int>(text.size()), SQLITE_TRANSIENT);
 }
 
+// raw(x), raw(x, size)
+void ToRaw(sqlite3_context* context, int count, Arguments arguments) {
+    Column column;
+    ReadDeclaredType("raw", column);
+    if (count > 1) column.size = static_cast<std::uint32_t>(std::max(sqlite3_value_int(arguments[1]), 0));
+    ReturnStored(context, std::move(column), arguments[0]);
+}
+
 // date(x), which has no fraction and no zone; timestamp(x), timestamp(x, digits), which rounds the fraction
 template <bool whole_seconds>
 void ToDate(sqlite3_context* context, int count, Arguments arguments) {
@@ -219,6 +227,7 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_char", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::bytes>},
     {"kelp_char_chars", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::characters>},
     {"kelp_nchar", 1, 2, SQLITE_DETERMINISTIC, ToText<true, Unit::characters>},
+    {"kelp_raw", 1, 2, SQLITE_DETERMINISTIC, ToRaw},
     {"kelp_date", 1, 1, SQLITE_DETERMINISTIC, ToDate<true>},
     {"kelp_timestamp", 1, 2, SQLITE_DETERMINISTIC, ToDate<false>},
     {"kelp_span_ym", 2, 2, SQLITE_DETERMINISTIC, ToInterval<SQLT_INTERVAL_YM>},

@@ -27,6 +27,7 @@ inline constexpr Dialect::Spelling kCasts[] = {
     {"character", "kelp_char"},
     {"nchar", "kelp_nchar"},
     {"char", "kelp_char"},
+    {"raw", "kelp_raw"},
     {"date", "kelp_date"},
     {"timestamp", "kelp_timestamp"},
     {"interval year to month", "kelp_span_ym", false, "2"},

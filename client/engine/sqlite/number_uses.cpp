@@ -74,15 +74,29 @@ private:
         return type == SQLT_CHR || type == SQLT_AFC || IsDateType(type) || IsIntervalType(type);
     }
 
-    // cast(e as integer), whose parenthesis opens at `open`, or a table called so; integers are told by the digits that they are given.
+    // cast(e as T), whose parenthesis opens at `open`, or a table called so; integers are told by the digits that they are given.
+    // Of a text that is no number SQLite makes 0, for any type that is neither text nor blob.
     void Cast(std::size_t open) {
         constexpr std::uint8_t kDigits = 38;
         const std::size_t close = operands_.Partner(open);
         std::size_t as = open + 1;
         while (as < close && !IsWord(operands_.At(as), "as")) as = (operands_.At(as) == "(" ? operands_.Partner(as) : as) + 1;
+        if (as == close) return;
+        const std::string_view type = sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1));
         Column column;
-        if (as == close || !ReadDeclaredType(sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1)), column)) return;
+        (void)ReadDeclaredType(type, column);
         if (column.type == SQLT_NUM && column.precision == kDigits) Wrap({open + 1, as}, "kelp_whole(");
+        else if (HasBinaryDigits(column)) Wrap({open + 1, as}, "kelp_binary_double(");
+        else if (!HoldsText(type)) Wrap({open + 1, as}, "kelp_number(");
+    }
+
+    // By SQLite's own rule.
+    static bool HoldsText(std::string_view type) {
+        const auto holds = [type](std::string_view word) {
+            const auto same = [](char written, char letter) { return (written | ' ') == letter; };
+            return std::search(type.begin(), type.end(), word.begin(), word.end(), same) != type.end();
+        };
+        return holds("char") || holds("clob") || holds("text") || holds("blob");
     }
 
     void Wrap(Span span, const char* call) {

@@ -1,5 +1,5 @@
 // Uses of numbers that SQLite would answer as something else: texts beside ||, of which a number kept as a blob would be
-// its bytes, and casts to integers, which cut where a column rounds.
+// its bytes, casts to integers, which cut where a column rounds, and casts of what is no number, which would be 0.
 #pragma once
 
 #include "engine/sqlite/value_targets.h"
