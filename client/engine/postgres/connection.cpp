@@ -209,7 +209,9 @@ Status PgConnection::AskGuarded(const std::string& sql, const Wire::Values& valu
         else result = std::move(next);
     }
     Status rest = wire_->Drain();
-    return Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+    status = Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+    const bool has_rows = result && PQresultStatus(result.get()) == PGRES_TUPLES_OK;
+    return status.Ok() && !has_rows ? Refused(errors::kInternalError, "an answer without rows") : status;
 }
 
 Status PgConnection::ReadTable(Oid table, Table& read) {

@@ -39,6 +39,8 @@ Status ObjectLob::Ask(const char* sql, const Question& question, Result& found) 
     const Wire::Heeding heeding(Store().connection_.Server());
     Status status = Store().connection_.AskGuarded(sql, question.values, found);
     if (status.Number() == errors::kNoSuchObject) return Refused(errors::kNoLobValue, status.Detail());
+    const bool answered = PQntuples(found.get()) == 1 && !PQgetisnull(found.get(), 0, 0);
+    if (status.Ok() && !answered) return Refused(errors::kInternalError, "an answer without a value");
     return status;
 }
 
