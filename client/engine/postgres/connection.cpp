@@ -48,6 +48,7 @@ Status PgConnection::Enter() {
     if (wire_->Broken()) return wire_->Lost();
     if (streaming_) streaming_->ReadAhead();
     if (wire_->Broken()) return Refused(errors::kEndOfChannel, "the connection to the server was lost");    // by this call
+    if (!wire_->Idle()) return Refused(errors::kInternalError, "a batch is under way");
     if (!path_stands_) {
         if (Status status = SetPath(); !status.Ok()) return status;
     }
@@ -68,7 +69,6 @@ Status PgConnection::Enter(Effect effect) {
     }
     if (Status status = TellLockWait(); !status.Ok()) return status;
     if (Status status = lobs_->Settle(); status.Failed()) return status;
-    lobs_->StatementRuns();
     return {};
 }
 

@@ -80,7 +80,7 @@ public:
     [[nodiscard]] bool IsObjectType(Oid type) const;
     [[nodiscard]] PgLobStore& Large() { return *lobs_; }
     // Makes way for something else: has the query whose rows still come read them ahead, and forgets what closed queries
-    // have left with the server. 3114 on a broken connection.
+    // have left with the server. 3114 on a broken connection. Refused while a batch is under way, whose answers come first.
     Status Enter();
     // The same, and ends a transaction before a definition.
     Status Enter(Effect effect);

@@ -276,6 +276,27 @@ Status PgQuery::Load(RowSource& source, std::uint32_t row) noexcept try {
     return NoMemory();
 }
 
+// Whether the row joins the batch. Behind others nothing can be asked of the server: a row that fails there begins the next
+// batch instead.
+bool PgQuery::LoadForBatch(RowSource& source, std::uint32_t row, bool heeds, Batch& batch) noexcept {
+    Status status = Load(source, row);
+    const bool stops = status.Ok() && heeds && connection_.Server().Asked();
+    if (stops) {
+        status = PgConnection::Stopped();
+        batch.stop = row;
+    }
+    if (status.Ok()) return true;
+    batch.refused = stops || batch.sent == 0;
+    if (batch.refused) batch.refusal = std::move(status);
+    return false;
+}
+
+// Before the statement is sent: what was known of rows before may be so no more.
+PgConnection::Guard PgQuery::Begin(bool needs) noexcept {
+    connection_.Large().StatementRuns();
+    return connection_.SendGuard(needs);
+}
+
 Status PgQuery::ExecuteArray(RowSource& source, const ArrayRun& run, ArrayOutcome& outcome) {
     Close();
     if (connection_.Server().Asked()) return PgConnection::Stopped();
@@ -300,7 +321,7 @@ Status PgQuery::ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& 
     if (!status.Ok()) return status;
     Wire& server = connection_.Server();
     for (int runs = 0; runs == 0 || (runs == 1 && Renews(status)); ++runs) {
-        const PgConnection::Guard guard = connection_.SendGuard(false);
+        const PgConnection::Guard guard = Begin(false);
         server.SendExecute(name_.c_str(), bound_.Values(), binary_);
         connection_.SendRelease(guard);
         const Wire::Heeding heeding(server);
@@ -358,8 +379,9 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         stop = batch.stop.value_or(stop);
         Status failure = batch.failure;
         while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction) {
-            batch = RunBatch(source, row, row + batch.done, false);
-            if (batch.failure.Ok()) break;
+            const std::uint32_t before = batch.done;
+            batch = RunBatch(source, row, row + before, false);
+            if (batch.failure.Ok() && batch.sent == before) break;    // it is the row behind them that fails
             failure = batch.failure;
         }
         if (batch.failure.Ok()) {
@@ -395,11 +417,8 @@ PgQuery::Batch PgQuery::RunBatch(RowSource& source, std::uint32_t first, std::ui
     std::size_t bytes = 0;
     PgConnection::Guard guard = PgConnection::Guard::none;
     for (std::uint32_t row = first; row < last && bytes < kBatchBytes; ++row) {
-        batch.refusal = Load(source, row);
-        if (batch.refusal.Ok() && heeds && server.Asked()) batch.refusal = PgConnection::Stopped();
-        batch.refused = !batch.refusal.Ok();
-        if (batch.refused) break;
-        if (batch.sent == 0) guard = connection_.SendGuard(true);
+        if (!LoadForBatch(source, row, heeds, batch)) break;
+        if (batch.sent == 0) guard = Begin(true);
         server.SendExecute(name_.c_str(), bound_.Values(), binary_);
         bytes += bound_.Bytes();
         if (++batch.sent % kRowsBetweenPushes == 0) server.Push();

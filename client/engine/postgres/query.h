@@ -77,6 +77,8 @@ private:
     [[nodiscard]] bool IsStale(const Status& status) const;
     bool Renews(Status& failure);
     Status Load(RowSource& source, std::uint32_t row) noexcept;
+    bool LoadForBatch(RowSource& source, std::uint32_t row, bool heeds, Batch& batch) noexcept;
+    PgConnection::Guard Begin(bool needs) noexcept;
 
     Status ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& outcome);
     Status ExecuteSavepoint(ArrayOutcome& outcome);

@@ -133,7 +133,7 @@ PgQuery::Batch PgQuery::RunWhole(RowSource& source, std::uint32_t first, std::ui
     }
     if (batch.sent == 0) return batch;
     const Wire::Values whole = FinishArrays(batch.sent);
-    const PgConnection::Guard guard = connection_.SendGuard(true);
+    const PgConnection::Guard guard = Begin(true);
     server.SendExecute(whole_name_.c_str(), whole, true);
     connection_.SendRelease(guard);
     const Wire::Heeding heeding(server, !batch.refused);

@@ -27,14 +27,8 @@ PgConnection::Guard PgQuery::SendReturning(RowSource& source, std::uint32_t firs
     PgConnection::Guard guard = PgConnection::Guard::none;
     std::size_t bytes = 0;
     for (std::uint32_t row = first; row < last && bytes < kMostBytes; ++row) {
-        batch.refusal = Load(source, row);
-        if (batch.refusal.Ok() && heeds && server.Asked()) {
-            batch.refusal = PgConnection::Stopped();
-            batch.stop = row;
-        }
-        batch.refused = !batch.refusal.Ok();
-        if (batch.refused) break;
-        if (batch.sent == 0) guard = connection_.SendGuard(true);
+        if (!LoadForBatch(source, row, heeds, batch)) break;
+        if (batch.sent == 0) guard = Begin(true);
         else server.Send(RowCommand("savepoint", batch.sent).text);
         server.SendExecute(name_.c_str(), bound_.Values(), binary_);
         bytes += bound_.Bytes();
@@ -100,6 +94,7 @@ PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std
         kept = row;
         ended = UndoRows(kept, batch);
     }
+    if (kept > 1) connection_.Large().StatementRuns();    // which may have changed the rows of those before
     if (ended.Ok()) ended = kept == 0 ? failure : ReleaseRows(guard, batch);
     ended = connection_.Settle(guard, std::move(ended));
     if (!ended.Ok()) {    // nothing of it is left

@@ -29,7 +29,7 @@ Status PgQuery::Open(RowSource& source, const QueryRun& run) {
 // Rows are locked as they are sent.
 Status PgQuery::Start(const QueryRun& run) {
     Wire& server = connection_.Server();
-    guard_ = connection_.SendGuard(effect_ == Effect::locks);
+    guard_ = Begin(effect_ == Effect::locks);
     server.SendExecute(name_.c_str(), bound_.Values(), binary_);
     connection_.SendRelease(guard_);
     const Wire::Heeding heeding(server);
