@@ -167,6 +167,7 @@ private:
     // A query becomes "with kelp_source(c1, ...) as (<query>) select kelp_store(c1, ...), ... from kelp_source". What
     // ON CONFLICT follows needs a condition before it.
     void WrapQuery(Span query, const Columns& targets, bool with_condition) {
+        AssignQuery(query, targets);
         const bool concerned = std::any_of(targets.begin(), targets.end(),
                                            [](const TableColumn* target) { return target && target->concerned; });
         if (!concerned) return;
@@ -180,6 +181,39 @@ private:
         }
         targets_.edits.push_back({Begin(query.first), Begin(query.last), "with kelp_source(" + names + ") as (",
                                   "\n) select " + values + " from kelp_source" + (with_condition ? " where 1 " : " ")});
+    }
+
+    // The values of a query, or of several with UNION ALL between them: others compare theirs.
+    void AssignQuery(Span query, const Columns& targets) {
+        std::vector<std::size_t> parts = {query.first};
+        for (;;) {
+            const std::size_t next = FindWord(parts.back(), {"union", "except", "intersect"});
+            if (next >= query.last) break;
+            if (!Is(next, "union") || !Is(next + 1, "all")) return;
+            parts.push_back(next + 2);
+        }
+        for (const std::size_t part : parts)
+            if (Is(part, "select")) AssignItems(part, query.last, targets);
+    }
+
+    // A placeholder's value becomes a text before it is a number to SQLite; it is measured when a row comes.
+    void AssignItems(std::size_t select, std::size_t last, const Columns& targets) {
+        std::size_t at = select + (Is(select + 1, "distinct") || Is(select + 1, "all") ? 2 : 1);
+        for (const TableColumn* const target : targets) {
+            const std::size_t end = std::min(FindWord(at, {",", "from", "where", "group", "having", "order", "limit", "union"}), last);
+            const bool has_alias = end - at > 2 && Is(end - 2, "as");
+            const Span value = Bare({at, has_alias ? end - 2 : end});
+            const std::size_t index = value.Size() == 1 ? ParameterOf(pieces_[value.first]) : kNoParameter;
+            if (target && index == kNoParameter) {
+                NoteText({at, end}, *target);
+            } else if (target && IsText(*target)) {
+                Column text = target->column;
+                text.size = text.characters = 0;
+                targets_.parameters.push_back({index, std::move(text), Coercion::Purpose::store});
+            }
+            if (!Is(end, ",")) return;
+            at = end + 1;
+        }
     }
 
     static std::string Stored(const std::string& expression, const TableColumn* target) {
@@ -230,14 +264,29 @@ private:
         span = Bare(span);
         NoteObject(span, target);
         const std::size_t index = span.Size() == 1 ? ParameterOf(pieces_[span.first]) : kNoParameter;
-        if (target && index != kNoParameter && (target->concerned || ObjectKindOf(target->column))) {
+        if (target && index != kNoParameter && (target->concerned || ObjectKindOf(target->column) || IsText(*target))) {
             targets_.parameters.push_back({index, target->column, Coercion::Purpose::store});
             return;
         }
-        if (!target || !target->concerned || IsHarmless(span, *target)) return;
+        if (!target) return;
+        NoteText(span, *target);
+        if (!target->concerned || IsHarmless(span, *target)) return;
         const std::string number = LongNumber(span);
         targets_.edits.push_back({Begin(span.first), End(span.last - 1), number.empty() ? "kelp_store(" : "kelp_store('" + number + '\'',
                                   Described(*target), !number.empty()});
+    }
+
+    // By its words; one of which they say nothing is what SQLite makes of it.
+    static bool IsText(const TableColumn& target) {
+        Column column;
+        return ReadDeclaredType(target.declared, column) && IsTextType(column.type);
+    }
+
+    void NoteText(Span span, const TableColumn& target) {
+        if (target.concerned || !IsText(target)) return;
+        const std::string number = LongNumber(span);
+        if (number.empty()) targets_.texts.push_back(span);
+        else targets_.edits.push_back({Begin(span.first), End(span.last - 1), Literal(number), "", true});
     }
 
     void NoteObject(Span span, const TableColumn* target) {

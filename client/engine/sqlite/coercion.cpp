@@ -1,10 +1,9 @@
 // Making values what a column takes: the cheap tests first, so that a value that fits costs little.
 #include "engine/sqlite/coercion.h"
 
-#include <sqlite3.h>
-
 #include <algorithm>
 #include <array>
+#include <charconv>
 #include <cmath>
 #include <cstring>
 
@@ -96,8 +95,8 @@ int ReadDate(std::string_view text, std::uint16_t type, date::DateTime& value) {
 }  // namespace
 
 // Without limits nothing is refused for its size.
-Coercion::Coercion(Column column, Purpose purpose)
-    : column_(std::move(column)), purpose_(purpose), among_reals_(HasBinaryDigits(column_)) {
+Coercion::Coercion(Column column, Purpose purpose, Origin origin)
+    : column_(std::move(column)), purpose_(purpose), origin_(origin), among_reals_(HasBinaryDigits(column_)) {
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) column_.scale = kFloating;
     const bool is_large = column_.type == SQLT_CLOB || column_.type == SQLT_DBCLOB || column_.type == SQLT_BLOB;
     if (is_large) column_.size = column_.characters = 0;    // which are a locator's
@@ -232,18 +231,23 @@ Status Coercion::ApplyDecimal(const OCINumber& number, Datum& value) {
     return {};
 }
 
-// As the engine writes numbers that it keeps as texts.
+// False when a number holds no such real.
+bool Coercion::ReadReal(double real) {
+    if (std::fabs(real) < kSmallNumber && real != 0) return false;
+    return (origin_ == Origin::bound ? number::FromDouble : number::FromReal15)(real, &number_) == 0;
+}
+
+// As it comes out; what no number holds, as it reads back.
 void Coercion::WriteNumber(Datum& value) {
     std::size_t length = 0;
     text_.resize(number::kMaxPlainText);
-    if (value.kind == Kind::decimal) {
-        (void)number::ToPlainText(*static_cast<const OCINumber*>(value.data), '.', text_.data(), &length);
-    } else {
-        const auto room = static_cast<int>(text_.size());
-        if (value.kind == Kind::integer) sqlite3_snprintf(room, text_.data(), "%lld", static_cast<long long>(value.integer));
-        else sqlite3_snprintf(room, text_.data(), "%!.15g", value.real);
-        length = std::strlen(text_.data());
-    }
+    const auto write = [&](auto digits) {
+        length = static_cast<std::size_t>(std::to_chars(text_.data(), text_.data() + text_.size(), digits).ptr - text_.data());
+    };
+    if (value.kind == Kind::integer) write(value.integer);
+    else if (value.kind == Kind::decimal) (void)number::ToPlainText(value.Number(), '.', text_.data(), &length);
+    else if (ReadReal(value.real)) (void)number::ToPlainText(number_, '.', text_.data(), &length);
+    else write(value.real);
     Set(value, Kind::text, text_.data(), length);
 }
 

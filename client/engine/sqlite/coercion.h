@@ -17,7 +17,10 @@ public:
     // A value that is compared with a column is read as the column's type, but neither rounded nor measured.
     enum class Purpose : std::uint8_t { store, compare };
 
-    explicit Coercion(Column column, Purpose purpose = Purpose::store);
+    // Of a real that is bound every digit counts, of one that the engine computed as many as of a number.
+    enum class Origin : std::uint8_t { bound, computed };
+
+    explicit Coercion(Column column, Purpose purpose = Purpose::store, Origin origin = Origin::bound);
 
     // Whether values of the column need a look at all; whether those compared with it do.
     static bool Concerns(const Column& column);
@@ -33,6 +36,7 @@ private:
     void KeepAmongReals(Datum& value);
     Status ApplyDecimal(const OCINumber& number, Datum& value);
     Status ApplyText(Datum& value);
+    bool ReadReal(double real);
     void WriteNumber(Datum& value);
     void WriteBytes(Datum& value);
     Status ApplyBytes(Datum& value);
@@ -44,6 +48,7 @@ private:
 
     Column column_;
     Purpose purpose_;
+    Origin origin_;
     bool among_reals_;
     OCINumber number_{};
     DateText date_{};

@@ -197,6 +197,10 @@ bool IsNumberType(std::uint16_t type) {
     return type == SQLT_NUM || type == SQLT_BFLOAT || type == SQLT_BDOUBLE;
 }
 
+bool IsTextType(std::uint16_t type) {
+    return type == SQLT_CHR || type == SQLT_AFC || type == SQLT_LNG || type == SQLT_CLOB || type == SQLT_DBCLOB;
+}
+
 bool HasBinaryDigits(const Column& column) {
     return column.type == SQLT_NUM && column.scale == kFloating && column.precision != 0;
 }

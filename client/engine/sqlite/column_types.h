@@ -13,8 +13,9 @@ namespace engine::sqlite {
 // nothing known; the column is then one of text without a limit.
 bool ReadDeclaredType(std::string_view declared, Column& column);
 
-// Whether values of the type are numbers; whether they are dates and times, kept as text.
+// Whether values of the type are numbers; texts, of large objects, too; dates and times, kept as text.
 bool IsNumberType(std::uint16_t type);
+bool IsTextType(std::uint16_t type);
 bool IsDateType(std::uint16_t type);
 // Of binary digits: float, real, double precision.
 bool HasBinaryDigits(const Column& column);

@@ -195,7 +195,7 @@ void Coerce(sqlite3_context* context, int, Arguments arguments) {
         Column column;
         if (!ReadDeclaredType(TextOf(arguments[1]), column)) return sqlite3_result_value(context, arguments[0]);
         column.name = TextOf(arguments[2]);
-        made = std::make_unique<Coercion>(std::move(column), purpose);
+        made = std::make_unique<Coercion>(std::move(column), purpose, Coercion::Origin::computed);
         coercion = made.get();
     }
     OCINumber number;

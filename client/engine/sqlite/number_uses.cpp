@@ -18,6 +18,7 @@ public:
         : sql_(reading.sql), pieces_(reading.pieces), operands_(reading.operands), names_(reading.names), targets_(targets) {}
 
     void Find() {
+        for (const Span text : targets_.texts) StoredText(text);
         for (std::size_t at = operands_.FirstExpression(); at < pieces_.size(); ++at) {
             if (pieces_[at] == "||") Concatenation(at);
             else if (IsWord(pieces_[at], "like")) Like(at);
@@ -53,6 +54,13 @@ private:
 
     void NumberAsText(Span span) {
         if (MayBeNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+    }
+
+    // What is stored, as far as it is no comparison; in a select list it may have an alias.
+    void StoredText(Span stored) {
+        const Span expression = operands_.From(stored.first);
+        const bool is_all = expression.last == stored.last || expression.last + 1 == stored.last || IsWord(operands_.At(expression.last), "as");
+        if (is_all && expression.Size() > 0) NumberAsText(expression);
     }
 
     bool MayBeNumber(Span span) {

@@ -47,6 +47,7 @@ struct ValueTargets {
         Column column;
     };
     std::vector<Parameter> parameters;
+    std::vector<Span> texts;    // expressions, by pieces, of which SQLite itself makes texts: what large objects take, and texts of any size
     std::vector<Interval> intervals;
     std::vector<Object> objects;
     std::vector<Edit> edits;    // in any order
