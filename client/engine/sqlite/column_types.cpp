@@ -197,6 +197,8 @@ bool IsNumberType(std::uint16_t type) {
     return type == SQLT_NUM || type == SQLT_BFLOAT || type == SQLT_BDOUBLE;
 }
 
+bool IsNumeric(std::uint16_t type) { return IsNumberType(type) || type == SQLT_IBFLOAT || type == SQLT_IBDOUBLE; }
+
 bool IsTextType(std::uint16_t type) {
     return type == SQLT_CHR || type == SQLT_AFC || type == SQLT_LNG || type == SQLT_CLOB || type == SQLT_DBCLOB;
 }

@@ -15,6 +15,7 @@ bool ReadDeclaredType(std::string_view declared, Column& column);
 
 // Whether values of the type are numbers; texts, of large objects, too; dates and times, kept as text.
 bool IsNumberType(std::uint16_t type);
+bool IsNumeric(std::uint16_t type);    // or of the machine's floats
 bool IsTextType(std::uint16_t type);
 bool IsDateType(std::uint16_t type);
 // Of binary digits: float, real, double precision.

@@ -6,6 +6,7 @@
 
 #include "date/date.h"
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/functions.h"
 #include "engine/sqlite/names.h"
 #include "engine/sqlite/operands.h"
 #include "handles/errors.h"
@@ -19,12 +20,6 @@ bool IsOperator(std::string_view piece) {
     return piece == "<<" || piece == ">>";
 }
 
-bool TakesNumbers(std::string_view function) {
-    return IsOneOf(function, {"sum", "avg", "total", "abs", "mod", "sign", "ceil", "ceiling", "floor", "exp", "ln", "log",
-                              "log2", "log10", "pow", "power", "sqrt", "sin", "cos", "tan", "asin", "acos", "atan", "atan2",
-                              "sinh", "cosh", "tanh", "asinh", "acosh", "atanh", "degrees", "radians"});
-}
-
 class Finder {
 public:
     explicit Finder(StatementReading& reading) : pieces_(reading.pieces), operands_(reading.operands), names_(reading.names) {}
@@ -32,7 +27,7 @@ public:
     Status Find() {
         for (std::size_t at = operands_.FirstExpression(); at < pieces_.size(); ++at) {
             const bool calculates = IsOperator(At(at)) ? IsDate(Left(at)) || IsDate(operands_.OneFrom(at + 1))
-                                                       : At(at + 1) == "(" && TakesNumbers(At(at)) && AnyDate(Arguments(at));
+                                                       : At(at + 1) == "(" && TakesNumbers(At(at)) && AnyDate(operands_.Arguments(at));
             if (!names_.Failure().Ok()) return names_.Failure();
             if (calculates) return Error(errors::kInconsistentTypes, detail_);
         }
@@ -50,31 +45,6 @@ private:
         return IsOneOf(Before(span.first), {"in", "exists"}) ? Span{} : span;
     }
 
-    // Of the call whose name stands at `function`.
-    [[nodiscard]] std::vector<Span> Arguments(std::size_t function) const {
-        std::vector<Span> arguments = operands_.List({function + 1, operands_.Partner(function + 1) + 1});
-        if (IsOneOf(At(arguments[0].first), {"distinct", "all"})) ++arguments[0].first;
-        return arguments;
-    }
-
-    // Those of its arguments, or of the values of a CASE, one of which an expression is; none for anything else.
-    [[nodiscard]] std::vector<Span> Values(Span span) const {
-        std::vector<Span> values = operands_.Choices(span);
-        if (!values.empty() || At(span.first + 1) != "(" || operands_.OneFrom(span.first).last != span.last) return values;
-        const std::string_view function = At(span.first);
-        values = Arguments(span.first);
-        if (IsOneOf(function, {"min", "max", "greatest", "least"})) return values;
-        std::size_t first = 0, step = values.size();
-        if (IsOneOf(function, {"nvl2", "iif", "if"})) first = step = 1;
-        else if (IsWord(function, "decode")) first = step = 2;
-        else if (IsOneOf(function, {"lag", "lead"})) step = 2;    // and the default
-        else if (!IsOneOf(function, {"trunc", "nullif", "first_value", "last_value", "nth_value"})) return {};
-        std::vector<Span> chosen;
-        for (std::size_t index = first; index < values.size(); index += step) chosen.push_back(values[index]);
-        if (first == 2 && values.size() % 2 == 0) chosen.push_back(values.back());    // decode's default
-        return chosen;
-    }
-
     bool AnyDate(const std::vector<Span>& spans) {
         return std::any_of(spans.begin(), spans.end(), [&](Span span) { return IsDate(span); });
     }
@@ -83,7 +53,7 @@ private:
         span = operands_.Bare(span);
         if (span.Size() == 0) return false;
         if (operands_.IsQuery(span)) return AnswersDate(span);
-        if (const std::vector<Span> values = Values(span); !values.empty()) return AnyDate(values);
+        if (const std::vector<Span> answers = operands_.Answers(span); !answers.empty()) return AnyDate(answers);
         detail_ = "a date";
         if (span.Size() == 1 && (IsLiteral(At(span.first)) || IsWord(At(span.first), "current_time")))
             return IsWord(At(span.first), "current_time") || IsDateText(PlainText(At(span.first)));

@@ -9,6 +9,7 @@
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/connection.h"
 #include "engine/sqlite/functions.h"
+#include "engine/sqlite/names.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/stored_number.h"
 #include "oci.h"
@@ -188,6 +189,19 @@ void DescribeItem(const SelectItem& item, Column& column, bool& typed) {
     }
 }
 
+// What neither a declaration nor its own text tells is a number when all that it may answer is, by the columns' names.
+void DescribeNumbers(sqlite3* database, std::string_view sql, std::vector<Column>& columns, std::vector<bool>& untyped) {
+    const std::vector<std::string_view> pieces = Split(sql);
+    if (!IsOneOf(pieces[0], {"select", "with"})) return;
+    StatementReading reading(database, sql, pieces);
+    const std::vector<bool> numbers = reading.names.Numbers(0, untyped);
+    for (std::size_t index = 0; index < columns.size(); ++index) {
+        if (!numbers[index]) continue;
+        MakeNumber(columns[index]);
+        untyped[index] = false;
+    }
+}
+
 }  // namespace
 
 Verb VerbOf(std::string_view sql) {
@@ -223,6 +237,8 @@ void DescribeColumns(sqlite3* database, sqlite3_stmt* statement, std::string_vie
         columns.push_back(std::move(column));
         untyped.push_back(!typed);
     }
+    const bool any_untyped = std::find(untyped.begin(), untyped.end(), true) != untyped.end();
+    if (any_untyped && sqlite3_stmt_readonly(statement)) DescribeNumbers(database, sql, columns, untyped);
 }
 
 void DescribeValue(sqlite3_value* value, Column& column) {

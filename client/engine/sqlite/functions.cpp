@@ -16,6 +16,7 @@
 #include "engine/sqlite/errors.h"
 #include "engine/sqlite/function_values.h"
 #include "engine/sqlite/interval_text.h"
+#include "engine/sqlite/operands.h"
 #include "engine/sqlite/stored_number.h"
 #include "handles/errors.h"
 #include "number/number.h"
@@ -247,9 +248,8 @@ constexpr struct {
     std::string_view name;
     ResultType result;
 } kEngineFunctions[] = {
-    {"count", {"number"}}, {"sum", {"number"}}, {"total", {"number"}}, {"avg", {"number"}},
-    {"abs", {"number"}},   {"length", {"number"}}, {"row_number", {"number"}},
-    {"rank", {"number"}},  {"dense_rank", {"number"}}, {"max", {"", 1}}, {"min", {"", 1}},
+    {"count", {"number"}}, {"length", {"number"}}, {"row_number", {"number"}}, {"rank", {"number"}}, {"dense_rank", {"number"}},
+    {"percent_rank", {"number"}}, {"cume_dist", {"number"}}, {"ntile", {"number"}}, {"max", {"", 1}}, {"min", {"", 1}},
 };
 
 std::array<std::span<const FunctionRow>, 4> Tables() {
@@ -298,7 +298,13 @@ ResultType FunctionResult(std::string_view name) {
     for (const auto& row : kEngineFunctions) {
         if (IsWord(name, row.name)) return row.result;
     }
-    return {};
+    return {TakesNumbers(name) ? "number" : ""};
+}
+
+bool TakesNumbers(std::string_view function) {
+    return IsOneOf(function, {"sum", "avg", "total", "abs", "mod", "sign", "ceil", "ceiling", "floor", "exp", "ln", "log",
+                              "log2", "log10", "pow", "power", "sqrt", "sin", "cos", "tan", "asin", "acos", "atan", "atan2",
+                              "sinh", "cosh", "tanh", "asinh", "acosh", "atanh", "degrees", "radians"});
 }
 
 }  // namespace engine::sqlite

@@ -55,5 +55,7 @@ struct ResultType {
     int like = 0;
 };
 ResultType FunctionResult(std::string_view name);
+// One of SQLite's own that calculates with numbers, and answers one.
+bool TakesNumbers(std::string_view function);
 
 }  // namespace engine::sqlite

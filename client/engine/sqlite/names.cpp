@@ -48,6 +48,31 @@ const TableColumn* Names::AnswerOf(Span span) {
     return &columns_.emplace_back(std::move(answered));
 }
 
+std::vector<bool> Names::Numbers(std::size_t query, std::vector<bool> meant) {
+    for (std::size_t at = query; !At(at).empty() && At(at) != ")"; ++at) {
+        if (At(at) == "(") at = operands_.Partner(at);
+        if (!IsOneOf(At(at), {"select", "values"})) continue;
+        const std::vector<Item> items = IsWord(At(at), "select") ? Items(at) : std::vector<Item>();
+        for (std::size_t index = 0; index < meant.size(); ++index)
+            meant[index] = meant[index] && items.size() == meant.size() && IsNumber(items[index].expression);
+    }
+    return meant;
+}
+
+bool Names::IsNumber(Span span) {
+    if (span.Size() == 0) return false;
+    span = operands_.Bare(span);
+    if (operands_.IsQuery(span)) return Numbers(span.first, {true})[0];
+    const std::vector<Span> answers = operands_.Answers(span);
+    if (answers.empty()) {
+        const TableColumn* const type = AnswerOf(span);
+        return type && IsNumeric(type->column.type);
+    }
+    const auto is_null = [&](Span answer) { return answer.Size() == 1 && IsWord(At(answer.first), "null"); };
+    return std::all_of(answers.begin(), answers.end(), [&](Span answer) { return is_null(answer) || IsNumber(answer); }) &&
+           !std::all_of(answers.begin(), answers.end(), is_null);
+}
+
 // ---- Names
 
 const TableColumn* Names::Resolve(Span name) {

@@ -29,6 +29,9 @@ public:
     const TableColumn* TypeOf(Span span);
     // The column that an expression is, or one of the type that its text tells; else null.
     const TableColumn* AnswerOf(Span span);
+    // Of the columns meant of a query, or of several with UNION and its like between them, those whose values are all
+    // numbers or null.
+    std::vector<bool> Numbers(std::size_t query, std::vector<bool> meant);
     // 932 when a name was of a date or an interval in one table and of another type in another.
     [[nodiscard]] const Status& Failure() const { return status_; }
 
@@ -90,6 +93,7 @@ private:
     bool Expand(const Table& table, std::vector<Listed>& columns);
     bool ExpandQuery(std::size_t query, std::vector<Listed>& columns);
     static bool IsMerged(const Table& table, const std::string& name, const std::vector<Listed>& before);
+    bool IsNumber(Span span);
     [[nodiscard]] Item ReadItem(Span span) const;
     [[nodiscard]] bool TableHasColumnOf(const TableName& table, TypeTest is_meant) const;
     bool QueryHasColumnOf(std::size_t query, TypeTest is_meant);

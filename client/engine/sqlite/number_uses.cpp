@@ -65,10 +65,7 @@ private:
 
     bool MayBeNumber(Span span) {
         if (span.Size() == 1 && ParameterOf(operands_.At(span.first)) != kNoParameter) return true;
-        if (const TableColumn* const column = names_.AnswerOf(span)) {
-            const std::uint16_t type = column->column.type;
-            return IsNumberType(type) || type == SQLT_IBFLOAT || type == SQLT_IBDOUBLE;
-        }
+        if (const TableColumn* const column = names_.AnswerOf(span)) return IsNumeric(column->column.type);
         const std::vector<Span> choices = operands_.Choices(span);
         return std::any_of(choices.begin(), choices.end(), [&](Span choice) { return MayBeNumber(operands_.Bare(choice)); });
     }

@@ -213,6 +213,29 @@ std::vector<Span> Operands::Choices(Span span) const {
     return values;
 }
 
+std::vector<Span> Operands::Arguments(std::size_t function) const {
+    std::vector<Span> arguments = List({function + 1, Partner(function + 1) + 1});
+    if (IsOneOf(At(arguments[0].first), {"distinct", "all"})) ++arguments[0].first;
+    return arguments;
+}
+
+std::vector<Span> Operands::Answers(Span span) const {
+    std::vector<Span> values = Choices(span);
+    if (!values.empty() || At(span.first + 1) != "(" || OneFrom(span.first).last != span.last) return values;
+    const std::string_view function = At(span.first);
+    values = Arguments(span.first);
+    if (IsOneOf(function, {"min", "max", "greatest", "least"})) return values;
+    std::size_t first = 0, step = values.size();
+    if (IsOneOf(function, {"nvl2", "iif", "if"})) first = step = 1;
+    else if (IsWord(function, "decode")) first = step = 2;
+    else if (IsOneOf(function, {"lag", "lead"})) step = 2;    // and the default
+    else if (!IsOneOf(function, {"trunc", "nullif", "first_value", "last_value", "nth_value"})) return {};
+    std::vector<Span> chosen;
+    for (std::size_t index = first; index < values.size(); index += step) chosen.push_back(values[index]);
+    if (first == 2 && values.size() % 2 == 0) chosen.push_back(values.back());    // decode's default
+    return chosen;
+}
+
 std::size_t Operands::FirstExpression() const {
     if (IsOneOf(At(0), {"select", "with", "values", "insert", "replace", "update", "delete"})) return 0;
     if (!IsWord(At(0), "create")) return pieces_.size();

@@ -42,6 +42,10 @@ public:
     [[nodiscard]] std::vector<Span> List(Span span) const;
     // The values that a CASE, or a call like nvl, gives one of; none for anything else.
     [[nodiscard]] std::vector<Span> Choices(Span span) const;
+    // Of the call whose name stands at `function`, without DISTINCT.
+    [[nodiscard]] std::vector<Span> Arguments(std::size_t function) const;
+    // Those of its arguments, or of the values of a CASE, one of which an expression is; none for anything else.
+    [[nodiscard]] std::vector<Span> Answers(Span span) const;
 
     // Queries and changes are looked through from their start, what they define or explain is not; of create table and
     // create view their query is.
