@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cctype>
 #include <deque>
+#include <functional>
 #include <initializer_list>
 #include <string>
 #include <utility>
@@ -21,8 +22,8 @@ constexpr std::ptrdiff_t kExactDigits = 15;
 
 class Finder {
 public:
-    Finder(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces, ValueTargets& targets)
-        : database_(database), sql_(sql), pieces_(pieces), targets_(targets) {}
+    Finder(sqlite3* database, StatementReading& reading, ValueTargets& targets)
+        : database_(database), sql_(reading.sql), pieces_(reading.pieces), names_(reading.names), targets_(targets) {}
 
     Status Find() {
         if (Is(0, "create") || Is(0, "alter")) return Definition();
@@ -167,58 +168,59 @@ private:
     // A query becomes "with kelp_source(c1, ...) as (<query>) select kelp_store(c1, ...), ... from kelp_source". What
     // ON CONFLICT follows needs a condition before it.
     void WrapQuery(Span query, const Columns& targets, bool with_condition) {
-        AssignQuery(query, targets);
-        const bool concerned = std::any_of(targets.begin(), targets.end(),
-                                           [](const TableColumn* target) { return target && target->concerned; });
-        if (!concerned) return;
+        const std::vector<bool> texts = AssignQuery(query, targets);
+        bool concerned = false;
         std::string names;
         std::string values;
         for (std::size_t index = 0; index < targets.size(); ++index) {
             const std::string name = "c" + std::to_string(index + 1);
             const std::string_view separator = index > 0 ? ", " : "";
+            const std::string stored = Stored(name, targets[index], texts[index]);
+            concerned |= stored != name;
             names.append(separator).append(name);
-            values.append(separator).append(Stored(name, targets[index]));
+            values.append(separator).append(stored);
         }
+        if (!concerned) return;
         targets_.edits.push_back({Begin(query.first), Begin(query.last), "with kelp_source(" + names + ") as (",
                                   "\n) select " + values + " from kelp_source" + (with_condition ? " where 1 " : " ")});
     }
 
-    // The values of a query, or of several with UNION ALL between them: others compare theirs.
-    void AssignQuery(Span query, const Columns& targets) {
-        std::vector<std::size_t> parts = {query.first};
-        for (;;) {
-            const std::size_t next = FindWord(parts.back(), {"union", "except", "intersect"});
-            if (next >= query.last) break;
-            if (!Is(next, "union") || !Is(next + 1, "all")) return;
-            parts.push_back(next + 2);
+    // The placeholders of a query, or of several with UNION ALL between them: others compare theirs. Answers which of the
+    // columns have texts then.
+    std::vector<bool> AssignQuery(Span query, const Columns& targets) {
+        const std::vector<std::size_t> parts = names_.Parts(query.first);
+        const bool takes_all = std::all_of(parts.begin(), parts.end(), [&](std::size_t part) { return part == parts[0] || Is(part - 1, "all"); });
+        std::vector<bool> texts(targets.size(), true);
+        for (const std::size_t part : parts) {
+            std::vector<bool> of_part = names_.Texts(part, targets.size());
+            if (takes_all && Is(part, "select")) AssignItems(part, query.last, targets, of_part);
+            std::transform(texts.begin(), texts.end(), of_part.begin(), texts.begin(), std::logical_and<>());
         }
-        for (const std::size_t part : parts)
-            if (Is(part, "select")) AssignItems(part, query.last, targets);
+        return texts;
     }
 
     // A placeholder's value becomes a text before it is a number to SQLite; it is measured when a row comes.
-    void AssignItems(std::size_t select, std::size_t last, const Columns& targets) {
+    void AssignItems(std::size_t select, std::size_t last, const Columns& targets, std::vector<bool>& texts) {
         std::size_t at = select + (Is(select + 1, "distinct") || Is(select + 1, "all") ? 2 : 1);
-        for (const TableColumn* const target : targets) {
+        for (std::size_t column = 0; column < targets.size(); ++column) {
             const std::size_t end = std::min(FindWord(at, {",", "from", "where", "group", "having", "order", "limit", "union"}), last);
             const bool has_alias = end - at > 2 && Is(end - 2, "as");
             const Span value = Bare({at, has_alias ? end - 2 : end});
             const std::size_t index = value.Size() == 1 ? ParameterOf(pieces_[value.first]) : kNoParameter;
-            if (target && index == kNoParameter) {
-                NoteText({at, end}, *target);
-            } else if (target && IsText(*target)) {
-                Column text = target->column;
+            if (targets[column] && index != kNoParameter && IsText(*targets[column])) {
+                Column text = targets[column]->column;
                 text.size = text.characters = 0;
                 targets_.parameters.push_back({index, std::move(text), Coercion::Purpose::store});
+                texts[column] = true;
             }
             if (!Is(end, ",")) return;
             at = end + 1;
         }
     }
 
-    static std::string Stored(const std::string& expression, const TableColumn* target) {
-        if (!target || !target->concerned) return expression;
-        return "kelp_store(" + expression + Described(*target);
+    static std::string Stored(const std::string& expression, const TableColumn* target, bool is_text) {
+        if (target && target->concerned) return "kelp_store(" + expression + Described(*target);
+        return target && !is_text && IsText(*target) ? "kelp_text(" + expression + ")" : expression;
     }
     static std::string Described(const TableColumn& target) {
         return ", " + Literal(target.declared) + ", " + Literal(target.column.name) + ")";
@@ -271,9 +273,8 @@ private:
         if (!target) return;
         NoteText(span, *target);
         if (!target->concerned || IsHarmless(span, *target)) return;
-        const std::string number = LongNumber(span);
-        targets_.edits.push_back({Begin(span.first), End(span.last - 1), number.empty() ? "kelp_store(" : "kelp_store('" + number + '\'',
-                                  Described(*target), !number.empty()});
+        const std::string number = LongNumber(span, *target);
+        targets_.edits.push_back({Begin(span.first), End(span.last - 1), "kelp_store(" + number, Described(*target), !number.empty()});
     }
 
     // By its words; one of which they say nothing is what SQLite makes of it.
@@ -284,9 +285,9 @@ private:
 
     void NoteText(Span span, const TableColumn& target) {
         if (target.concerned || !IsText(target)) return;
-        const std::string number = LongNumber(span);
+        const std::string number = LongNumber(span, target);
         if (number.empty()) targets_.texts.push_back(span);
-        else targets_.edits.push_back({Begin(span.first), End(span.last - 1), Literal(number), "", true});
+        else targets_.edits.push_back({Begin(span.first), End(span.last - 1), "kelp_text(" + number, ")", true});
     }
 
     void NoteObject(Span span, const TableColumn* target) {
@@ -296,14 +297,15 @@ private:
             targets_.objects.push_back({index, table_, target->name, *kind});
     }
 
-    // A literal of a number with more digits than a real keeps, which is read as text; none for anything else.
-    std::string LongNumber(Span span) const {
+    // A literal of a number with more digits than a real keeps, as an expression that keeps them; none for anything else.
+    std::string LongNumber(Span span, const TableColumn& target) const {
         const bool has_sign = span.Size() == 2 && IsSign(span.first);
         const std::string_view number = pieces_[span.last - 1];
         if (span.Size() > (has_sign ? 2 : 1) || number.find_first_not_of("0123456789.eE+-") != number.npos) return {};
         const std::string_view digits = number.substr(0, number.find_first_of("eE"));
         if (std::count_if(digits.begin(), digits.end(), [](unsigned char c) { return std::isdigit(c); }) <= kExactDigits) return {};
-        return std::string(has_sign ? pieces_[span.first] : "").append(number);
+        const std::string literal = Literal(std::string(has_sign ? pieces_[span.first] : "").append(number));
+        return IsText(target) ? "kelp_number(" + literal + ")" : literal;
     }
 
     // A null, and a plain number for a column of numbers without limits.
@@ -319,6 +321,7 @@ private:
     sqlite3* database_;
     std::string_view sql_;
     const std::vector<std::string_view>& pieces_;
+    Names& names_;
     ValueTargets& targets_;
     TableName table_;                   // that is changed
     bool writes_alike_ = false;         // the same values into each row, and shows none
@@ -327,9 +330,8 @@ private:
 
 }  // namespace
 
-Status FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                       ValueTargets& targets) {
-    return Finder(database, sql, pieces, targets).Find();
+Status FindAssignments(sqlite3* database, StatementReading& reading, ValueTargets& targets) {
+    return Finder(database, reading, targets).Find();
 }
 
 }  // namespace engine::sqlite

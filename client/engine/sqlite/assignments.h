@@ -5,16 +5,13 @@
 
 #include <sqlite3.h>
 
-#include <string_view>
-#include <vector>
-
+#include "engine/sqlite/names.h"
 #include "engine/sqlite/value_targets.h"
 #include "handles/status.h"
 
 namespace engine::sqlite {
 
 // Refuses a definition with a default that its column would not take.
-Status FindAssignments(sqlite3* database, std::string_view sql, const std::vector<std::string_view>& pieces,
-                       ValueTargets& targets);
+Status FindAssignments(sqlite3* database, StatementReading& reading, ValueTargets& targets);
 
 }  // namespace engine::sqlite

@@ -48,10 +48,33 @@ const TableColumn* Names::AnswerOf(Span span) {
     return &columns_.emplace_back(std::move(answered));
 }
 
-std::vector<bool> Names::Numbers(std::size_t query, std::vector<bool> meant) {
+std::vector<std::size_t> Names::Parts(std::size_t query) const {
+    std::vector<std::size_t> parts;
     for (std::size_t at = query; !At(at).empty() && At(at) != ")"; ++at) {
         if (At(at) == "(") at = operands_.Partner(at);
-        if (!IsOneOf(At(at), {"select", "values"})) continue;
+        if (IsOneOf(At(at), {"select", "values"})) parts.push_back(at);
+    }
+    return parts;
+}
+
+// What cannot be told of a column refuses nothing.
+std::vector<bool> Names::Texts(std::size_t part, std::size_t count) {
+    std::vector<bool> texts(count);
+    std::vector<Listed> columns;
+    if (scopes_.empty()) ReadTables();
+    looks_ = 0;
+    Status status = std::exchange(status_, {});
+    const bool told = ExpandQuery(part, columns) && columns.size() == count;
+    status_ = std::move(status);
+    for (std::size_t index = 0; index < count && told; ++index) {
+        const std::uint16_t type = columns[index].column ? columns[index].column->column.type : 0;
+        texts[index] = IsTextType(type) || IsDateType(type) || IsIntervalType(type);
+    }
+    return texts;
+}
+
+std::vector<bool> Names::Numbers(std::size_t query, std::vector<bool> meant) {
+    for (const std::size_t at : Parts(query)) {
         const std::vector<Item> items = IsWord(At(at), "select") ? Items(at) : std::vector<Item>();
         for (std::size_t index = 0; index < meant.size(); ++index)
             meant[index] = meant[index] && items.size() == meant.size() && IsNumber(items[index].expression);

@@ -56,11 +56,9 @@ private:
         if (MayBeNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
     }
 
-    // What is stored, as far as it is no comparison; in a select list it may have an alias.
+    // What is stored, as far as it is no comparison.
     void StoredText(Span stored) {
-        const Span expression = operands_.From(stored.first);
-        const bool is_all = expression.last == stored.last || expression.last + 1 == stored.last || IsWord(operands_.At(expression.last), "as");
-        if (is_all && expression.Size() > 0) NumberAsText(expression);
+        if (operands_.From(stored.first).last == stored.last) AsText(stored);
     }
 
     bool MayBeNumber(Span span) {
@@ -76,7 +74,7 @@ private:
         const TableColumn* const column = operands_.IsColumn(span) ? names_.Resolve(span) : nullptr;
         if (!column) return false;
         const std::uint16_t type = column->column.type;
-        return type == SQLT_CHR || type == SQLT_AFC || IsDateType(type) || IsIntervalType(type);
+        return IsTextType(type) || IsDateType(type) || IsIntervalType(type);
     }
 
     // cast(e as T), whose parenthesis opens at `open`, or a table called so; integers are told by the digits that they are given.

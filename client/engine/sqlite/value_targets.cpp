@@ -108,8 +108,8 @@ Status Convert(std::string_view text, const Column& column, Coercion::Purpose pu
 
 Status FindValueTargets(sqlite3* database, std::string_view sql, bool has_intervals, ValueTargets& targets) {
     const std::vector<std::string_view> pieces = Split(sql);
-    Status status = FindAssignments(database, sql, pieces, targets);
     StatementReading reading(database, sql, pieces);
+    Status status = FindAssignments(database, reading, targets);
     if (status.Ok()) status = FindComparisons(reading, targets);
     if (status.Ok()) status = FindDateUses(reading);
     if (status.Ok()) FindNumberUses(reading, targets);
