@@ -63,6 +63,8 @@ struct StatementSource {
     Effect effect = Effect::reads;
     // The kind of each placeholder's values; null: nothing is bound to it.
     std::span<const Kind> parameters;
+    // The placeholders as the application wrote them, which are parts of columns' names.
+    std::span<const std::string_view> written = {};
 };
 
 // Gives the values of one execution after another.

@@ -66,6 +66,16 @@ std::vector<engine::Kind> KindsOf(const BoundText& text, const sql::EngineText& 
     return kinds;
 }
 
+std::vector<std::string_view> PlaceholdersOf(const BoundText& text, const sql::EngineText& sql) {
+    std::vector<std::string_view> written;
+    written.reserve(sql.placeholders.size());
+    for (const std::uint32_t index : sql.placeholders) {
+        const sql::Placeholder& placeholder = text.Scanned().placeholders[index];
+        written.push_back(std::string_view(text.Text()).substr(placeholder.begin, placeholder.end - placeholder.begin));
+    }
+    return written;
+}
+
 Status BindRows::Row(std::uint32_t row, std::span<engine::Datum> values) {
     for (std::size_t index = 0; index < slots_.size(); ++index) {
         const Slot& slot = slots_[index];

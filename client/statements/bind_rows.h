@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <span>
+#include <string_view>
 #include <vector>
 
 #include "engine/engine.h"
@@ -13,6 +14,8 @@
 
 // The kind of each of the engine's placeholders, null where nothing is bound yet.
 std::vector<engine::Kind> KindsOf(const BoundText& text, const sql::EngineText& sql);
+// Each of them as the application wrote it.
+std::vector<std::string_view> PlaceholdersOf(const BoundText& text, const sql::EngineText& sql);
 
 class BindRows final : public engine::RowSource {
 public:

@@ -114,8 +114,8 @@ Status Statement::Compile(std::size_t index, Compiled*& compiled) {
     compiled->query.reset();
     compiled->kinds = std::move(kinds);
     std::uint32_t offset = 0;
-    Status status = Engine().Compile({compiled->text.sql, EffectOf(Scanned().steps[index]), compiled->kinds},
-                                     compiled->query, offset);
+    Status status = Engine().Compile({compiled->text.sql, EffectOf(Scanned().steps[index]), compiled->kinds,
+                                      PlaceholdersOf(text_, compiled->text)}, compiled->query, offset);
     if (!status.Ok()) parse_error_offset_ = compiled->text.SourceOffset(offset);
     return status;
 }

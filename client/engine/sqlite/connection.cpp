@@ -150,7 +150,7 @@ Status SqliteConnection::Compile(const StatementSource& source, std::unique_ptr<
     try {
         Compilation made;
         status = Make(source.sql, made, error_offset);
-        if (status.Ok()) query = std::make_unique<SqliteQuery>(*this, std::move(made), source.sql, source.effect);
+        if (status.Ok()) query = std::make_unique<SqliteQuery>(*this, std::move(made), source);
     } catch (const std::bad_alloc&) {
         status = Error(errors::kOutOfMemory).From("SQLITE");
     }

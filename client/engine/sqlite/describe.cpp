@@ -116,11 +116,25 @@ std::string WithoutCalls(std::string name) {
     return name;
 }
 
+std::string WithPlaceholders(std::string_view name, std::span<const std::string> written) {
+    std::string shown;
+    std::size_t copied = 0;
+    Pieces pieces(name);
+    for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
+        const std::size_t index = ParameterOf(piece);
+        if (index >= written.size()) continue;
+        shown.append(name.substr(copied, pieces.At() - piece.size() - copied)).append(written[index]);
+        copied = pieces.At();
+    }
+    return shown.append(name.substr(copied));
+}
+
 // Names that were not quoted are shown in upper case. A name that stands quoted in the statement was.
-std::string ShownName(std::string_view name, std::string_view sql) {
+std::string ShownName(std::string_view name, std::string_view sql, std::span<const std::string> written) {
     if (sql.find('"' + std::string(name) + '"') != std::string_view::npos) return std::string(name);
     std::string shown = name.find("kelp_") == std::string_view::npos ? std::string(name)
                                                                      : WithMoments(AsWritten(WithoutCalls(std::string(name))));
+    if (shown.find('?') != shown.npos) shown = WithPlaceholders(shown, written);
     char quote = '\0';
     for (char& c : shown) {
         if (quote != '\0') {
@@ -222,14 +236,14 @@ Verb VerbOf(std::string_view sql) {
 }
 
 void DescribeColumns(sqlite3* database, sqlite3_stmt* statement, std::string_view sql, std::vector<Column>& columns,
-                     std::vector<bool>& untyped) {
+                     std::vector<bool>& untyped, std::span<const std::string> written) {
     const int count = sqlite3_column_count(statement);
     const std::vector<SelectItem> items = ReadSelectList(sql);
     const bool listed = items.size() == static_cast<std::size_t>(count);
     const WrittenNames names(database, statement, sql);
     for (int index = 0; index < count; ++index) {
         Column column;
-        column.name = ShownName(names.Name(index), sql);
+        column.name = ShownName(names.Name(index), sql, written);
         const char* declared = sqlite3_column_decltype(statement, index);
         bool typed = declared && ReadDeclaredType(declared, column);
         column.nullable = IsNullable(database, statement, index);

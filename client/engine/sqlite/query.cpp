@@ -36,7 +36,7 @@ bool HasRoom(std::vector<ArrayOutcome::Failure>& failures) noexcept {
 
 }  // namespace
 
-SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, std::string_view sql, Effect effect)
+SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, const StatementSource& source)
     : connection_(connection),
       statement_(std::move(compilation.statement)),
       table_(std::move(compilation.table)),
@@ -44,10 +44,11 @@ SqliteQuery::SqliteQuery(SqliteConnection& connection, Compilation compilation, 
       lobs_(std::move(compilation.lobs)),
       objects_(connection, std::move(compilation.objects)),
       as_written_(std::move(compilation.as_written)),
-      sql_(sql),
+      sql_(source.sql),
+      written_(source.written.begin(), source.written.end()),
       verb_(VerbOf(sql_)),
-      entry_{effect, sqlite3_stmt_readonly(statement_.get()) != 0, effect == Effect::controls && BeginsWith(sql, "savepoint"),
-             effect == Effect::controls && BeginsWith(sql, "rollback")},
+      entry_{source.effect, sqlite3_stmt_readonly(statement_.get()) != 0, source.effect == Effect::controls && BeginsWith(sql_, "savepoint"),
+             source.effect == Effect::controls && BeginsWith(sql_, "rollback")},
       parameters_(static_cast<std::size_t>(sqlite3_bind_parameter_count(statement_.get()))),
       coercions_(CoercionsOf(compilation.targets, parameters_.size())),
       intervals_(std::move(compilation.targets.intervals)) {}
@@ -101,7 +102,7 @@ void SqliteQuery::Describe() {
     untyped_.clear();
     if (sqlite3_column_count(statement_.get()) > 0) {
         sqlite3_stmt* const described = as_written_ ? as_written_.get() : statement_.get();
-        DescribeColumns(connection_.Database(), described, sql_, columns_, untyped_);
+        DescribeColumns(connection_.Database(), described, sql_, columns_, untyped_, written_);
         DescribeIntervals();
     }
     any_untyped_ = std::find(untyped_.begin(), untyped_.end(), true) != untyped_.end();

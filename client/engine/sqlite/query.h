@@ -19,7 +19,7 @@ namespace engine::sqlite {
 
 class SqliteQuery final : public Query {
 public:
-    SqliteQuery(SqliteConnection& connection, Compilation compilation, std::string_view sql, Effect effect);
+    SqliteQuery(SqliteConnection& connection, Compilation compilation, const StatementSource& source);
     ~SqliteQuery() override;
     SqliteQuery(const SqliteQuery&) = delete;
     SqliteQuery& operator=(const SqliteQuery&) = delete;
@@ -105,6 +105,7 @@ private:
     ObjectValues objects_;
     StatementHandle as_written_;
     std::string sql_;
+    std::vector<std::string> written_;    // its placeholders
     Verb verb_;
     SqliteConnection::Entry entry_;
     State state_ = State::closed;
