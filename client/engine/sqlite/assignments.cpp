@@ -186,13 +186,14 @@ private:
     }
 
     // The placeholders of a query, or of several with UNION ALL between them: others compare theirs. Answers which of the
-    // columns have texts then.
+    // columns have texts then, where SQLite itself would make texts.
     std::vector<bool> AssignQuery(Span query, const Columns& targets) {
         const std::vector<std::size_t> parts = names_.Parts(query.first);
         const bool takes_all = std::all_of(parts.begin(), parts.end(), [&](std::size_t part) { return part == parts[0] || Is(part - 1, "all"); });
+        const bool makes_texts = std::any_of(targets.begin(), targets.end(), MakesText);
         std::vector<bool> texts(targets.size(), true);
         for (const std::size_t part : parts) {
-            std::vector<bool> of_part = names_.Texts(part, targets.size());
+            std::vector<bool> of_part = makes_texts ? names_.Texts(part, targets.size()) : texts;
             if (takes_all && Is(part, "select")) AssignItems(part, query.last, targets, of_part);
             std::transform(texts.begin(), texts.end(), of_part.begin(), texts.begin(), std::logical_and<>());
         }
@@ -220,7 +221,7 @@ private:
 
     static std::string Stored(const std::string& expression, const TableColumn* target, bool is_text) {
         if (target && target->concerned) return "kelp_store(" + expression + Described(*target);
-        return target && !is_text && IsText(*target) ? "kelp_text(" + expression + ")" : expression;
+        return MakesText(target) && !is_text ? "kelp_text(" + expression + ")" : expression;
     }
     static std::string Described(const TableColumn& target) {
         return ", " + Literal(target.declared) + ", " + Literal(target.column.name) + ")";
@@ -283,8 +284,10 @@ private:
         return ReadDeclaredType(target.declared, column) && IsTextType(column.type);
     }
 
+    static bool MakesText(const TableColumn* target) { return target && !target->concerned && IsText(*target); }
+
     void NoteText(Span span, const TableColumn& target) {
-        if (target.concerned || !IsText(target)) return;
+        if (!MakesText(&target)) return;
         const std::string number = LongNumber(span, target);
         if (number.empty()) targets_.texts.push_back(span);
         else targets_.edits.push_back({Begin(span.first), End(span.last - 1), "kelp_text(" + number, ")", true});
