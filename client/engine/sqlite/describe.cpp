@@ -12,6 +12,7 @@
 #include "engine/sqlite/names.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/stored_number.h"
+#include "engine/sqlite/union_columns.h"
 #include "oci.h"
 
 namespace engine::sqlite {
@@ -253,6 +254,7 @@ void DescribeColumns(sqlite3* database, sqlite3_stmt* statement, std::string_vie
     }
     const bool any_untyped = std::find(untyped.begin(), untyped.end(), true) != untyped.end();
     if (any_untyped && sqlite3_stmt_readonly(statement)) DescribeNumbers(database, sql, columns, untyped);
+    WidenUnion(database, sql, columns, untyped);
 }
 
 void DescribeValue(sqlite3_value* value, Column& column) {
