@@ -137,8 +137,10 @@ Status Statement::ParseOnly() {
     return {};
 }
 
+// Rows that are open stay so, and what they are is what is described; else anew, for tables may have changed.
 Status Statement::DescribeOnly() {
-    if (Scanned().type != sql::StatementType::select) return {};
+    if (Scanned().type != sql::StatementType::select || run_.cursor.IsOpen()) return {};
+    if (!compiled_.empty()) compiled_[0].query.reset();
     Compiled* compiled = nullptr;
     Status status = Compile(0, compiled);
     described_ = status.Ok();
