@@ -124,7 +124,8 @@ private:
 // The last time that the value may have changed.
 std::uint64_t ColumnLob::Version() const {
     if (copy_ || !shared_->store) return 0;
-    return std::max({Store().ChangeOf(*column_, row_).at, Store().floor_, Store().undone_at_});
+    const LobStore::Change change = Store().ChangeOf(*column_, row_);
+    return std::max({change.at, change.gone_at, Store().floor_, Store().undone_at_});
 }
 
 // Whether the row is there and, unless the present value counts, what it was.
@@ -133,6 +134,11 @@ Status ColumnLob::Check() {
     if (seen_at_ < Store().floor_) return Error(errors::kSnapshotTooOld).From("SQLITE");
     const LobStore::Change change = Store().ChangeOf(*column_, row_);
     if (change.replaced_at > seen_at_) return NoValue();
+    if (change.gone_at > seen_at_) {    // unless that is undone
+        Status there = Open(false);
+        Store().LetGo();
+        if (there.Failed()) return there;
+    }
     if (change.at > seen_at_ && !is_current_) return Error(errors::kSnapshotTooOld).From("SQLITE");
     if (is_brief_ || Store().InTransaction(transaction_) || Store().connection_.Private()) return {};
     return CheckOthers();
@@ -188,7 +194,7 @@ Status ColumnLob::Draft(LobStore::Draft*& draft) {
     return draft ? Status() : Store().MakeDraft(column_, row_, draft);
 }
 
-void ColumnLob::NoteWrite() { Store().Note(*column_, row_, false); }
+void ColumnLob::NoteWrite() { Store().NoteWrite(*column_, row_); }
 
 Status ColumnLob::Write(std::uint64_t offset, std::span<const std::byte> in) {
     if (Status status = CheckWrite(); status.Failed()) return status;
@@ -273,7 +279,7 @@ std::shared_ptr<const LobColumn> LobStore::Column(std::string_view schema, std::
     columns_.reserve(columns_.size() + 1);
     if (!FindTable(*made)) {
         const bool changed = connection_.InTransaction() && sqlite3_total_changes(connection_.Database()) != changes_at_begin_;
-        tables_.push_back({made->schema, made->table, transaction_, changed, {}});
+        tables_.push_back({made->schema, made->table, transaction_, changed, 0, {}});
     }
     columns_.push_back(made);
     return made;
@@ -292,7 +298,9 @@ bool LobStore::InTransaction(std::uint64_t number) const {
 LobStore::Change LobStore::ChangeOf(const LobColumn& column, std::int64_t row) {
     const Table& table = *FindTable(column);
     const auto found = table.changes.find(row);
-    return found == table.changes.end() ? Change() : found->second;
+    Change change = found == table.changes.end() ? Change() : found->second;
+    change.gone_at = std::max(change.gone_at, table.emptied_at);
+    return change;
 }
 
 // A row that the transaction has written is locked. Who came too late to see it written takes it for one that is.
@@ -324,16 +332,26 @@ void LobStore::LetGo() noexcept {
 
 // ---- What happens to rows
 
-void LobStore::Note(const LobColumn& column, std::int64_t row, bool replaced) noexcept {
+// Of a row that is there, by its locator.
+void LobStore::NoteWrite(const LobColumn& column, std::int64_t row) noexcept {
     ++now_;
-    Note(*FindTable(column), row, replaced);
+    Note(*FindTable(column), row, 0);
 }
 
-void LobStore::Note(Table& table, std::int64_t row, bool replaced) noexcept {
+// Numbers that grow are those of new rows: one that is inserted may take the place of another, and so may one that is
+// updated and had another number, where a row was deleted.
+void LobStore::Note(Table& table, std::int64_t row, int operation) noexcept {
     try {
         if (table.changes.size() >= kMostChanges) throw std::bad_alloc();    // too many
         Change& change = table.changes[row];
-        change = {now_, replaced ? now_ : change.replaced_at, transaction_};
+        if (operation == SQLITE_DELETE) {
+            change.gone_at = now_;
+            return;
+        }
+        if (operation == SQLITE_INSERT) change.replaced_at = now_;
+        if (operation == SQLITE_UPDATE) change.replaced_at = std::max({change.replaced_at, change.gone_at, table.emptied_at});
+        change.at = now_;
+        change.transaction = transaction_;
     } catch (const std::bad_alloc&) {
         table.changes.clear();
         floor_ = now_;
@@ -342,15 +360,18 @@ void LobStore::Note(Table& table, std::int64_t row, bool replaced) noexcept {
     }
 }
 
-// Numbers that grow are those of new rows: one that is inserted may take the place of another.
 void LobStore::RowChanged(int operation, const char* table, std::int64_t row) noexcept {
     if (flushes_ || tables_.empty()) return;
     ++now_;
     for (Table& known : tables_)
-        if (IsSameName(known.name, table)) Note(known, row, operation != SQLITE_UPDATE);
+        if (IsSameName(known.name, table)) Note(known, row, operation);
 }
 
-void LobStore::RowsGone() noexcept { floor_ = ++now_; }
+void LobStore::RowsGone(std::string_view table) noexcept {
+    ++now_;
+    for (Table& known : tables_)
+        if (IsSameName(known.name, table)) known.emptied_at = now_;
+}
 
 void LobStore::Defined() noexcept { floor_ = ++now_; }
 

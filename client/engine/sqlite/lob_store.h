@@ -92,7 +92,7 @@ public:
     void TransactionBegins() noexcept;
     void Defined() noexcept;             // tables may be others
     void RowChanged(int operation, const char* table, std::int64_t row) noexcept;
-    void RowsGone() noexcept;            // rows were deleted that nobody has told of
+    void RowsGone(std::string_view table) noexcept;    // all of a table's rows, and nobody has told of each
 
 private:
     friend class ColumnLob;
@@ -104,8 +104,9 @@ private:
         ChunkedBytes bytes;
     };
     struct Change {
-        std::uint64_t at = 0;             // the last one
+        std::uint64_t at = 0;             // the last one of its values
         std::uint64_t replaced_at = 0;    // the last one that made it another row, or none
+        std::uint64_t gone_at = 0;        // it was deleted, unless that is undone
         std::uint64_t transaction = 0;    // of the last one
     };
     // A table with such columns.
@@ -113,6 +114,7 @@ private:
         std::string schema, name;
         std::uint64_t known_since;        // the transaction
         bool changed_before;              // that one, and nobody noted what
+        std::uint64_t emptied_at = 0;     // all rows were deleted, unless that is undone
         std::unordered_map<std::int64_t, Change> changes;
     };
     struct Shared {
@@ -121,8 +123,8 @@ private:
 
     Table* FindTable(const LobColumn& column);    // null before there is any such column
     Change ChangeOf(const LobColumn& column, std::int64_t row);    // nothing's where none is known
-    void Note(const LobColumn& column, std::int64_t row, bool replaced) noexcept;
-    void Note(Table& table, std::int64_t row, bool replaced) noexcept;
+    void NoteWrite(const LobColumn& column, std::int64_t row) noexcept;
+    void Note(Table& table, std::int64_t row, int operation) noexcept;
     Draft* FindDraft(const LobColumn& column, std::int64_t row);
     Status MakeDraft(const std::shared_ptr<const LobColumn>& column, std::int64_t row, Draft*& draft);
     Status Flush(Draft& draft);

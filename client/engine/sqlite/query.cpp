@@ -300,17 +300,14 @@ Status SqliteQuery::RunWithObjects() {
 Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* returned, std::uint64_t& affected) {
     Status status = BindRow(source, row, false);
     if (!status.Ok()) return status;
-    if (returned) {
-        status = RunReturning(row, *returned);
-    } else {
-        const std::uint64_t told = connection_.ToldChanges();
-        status = objects_.Any() ? RunWithObjects() : StepThrough();
-        // "delete from t" deletes all rows at once and tells of none.
-        if (verb_ == Verb::remove && connection_.ToldChanges() == told) connection_.LobsOfTables().RowsGone();
-    }
-    if (status.Ok() && verb_ != Verb::other) {
-        affected += static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
-    }
+    const std::uint64_t told = connection_.ToldChanges();
+    if (returned) status = RunReturning(row, *returned);
+    else status = objects_.Any() ? RunWithObjects() : StepThrough();
+    if (status.Failed() || verb_ == Verb::other) return status;
+    const auto changes = static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
+    affected += changes;
+    // "delete from t" deletes all rows at once and tells of none.
+    if (verb_ == Verb::remove && changes > 0 && connection_.ToldChanges() == told) connection_.LobsOfTables().RowsGone(table_);
     return status;
 }
 
