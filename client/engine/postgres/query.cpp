@@ -120,9 +120,10 @@ Status PgQuery::PrepareText(std::uint32_t& error_offset) {
 }
 
 // A list with large objects is asked for with the places of its rows, where the server can tell them. Without them only
-// those come that the server keeps for themselves.
+// those come that the server keeps for themselves. What a delete returns has no place any more: the values come whole.
 Status PgQuery::PrepareLobs() {
-    const std::string text = WithPlaces(text_, columns_.size(), lobs_, connection_.Server().ServerHasUtf8());
+    std::string text;
+    if (verb_ != Verb::remove) text = WithPlaces(text_, columns_.size(), lobs_, connection_.Server().ServerHasUtf8());
     Result description;
     std::uint32_t offset = 0;
     std::string name = connection_.NewName();

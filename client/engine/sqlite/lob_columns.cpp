@@ -45,7 +45,8 @@ namespace {
 class Rewriter {
 public:
     Rewriter(sqlite3* database, std::string_view sql, const PieceList& pieces, ListOfTable read, bool is_query, LobStore& store)
-        : database_(database), sql_(sql), pieces_(pieces), read_(std::move(read)), is_query_(is_query), store_(store) {}
+        : database_(database), sql_(sql), pieces_(pieces), read_(std::move(read)), is_query_(is_query),
+          is_delete_(IsWord(pieces[0], "delete")), store_(store) {}
 
     // False where the items cannot be told.
     bool Rewrite(std::size_t columns) {
@@ -101,9 +102,11 @@ private:
     void Note(std::size_t index, const TableColumn& column) {
         items.push_back({index, store_.Column(read_.table.schema, read_.table.name, column.name, *ObjectKindOf(column.column))});
     }
-    // What is neither text nor bytes is not read where it lies. Nor are long values that are not very long.
+    // What is neither text nor bytes is not read where it lies. Nor are long values that are not very long, and those of
+    // rows that are gone.
     [[nodiscard]] std::string Number(const TableColumn& column) const {
         const std::string value = Name() + '.' + QuotedName(column.name);
+        if (is_delete_) return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) else " + value + " end";
         if (column.column.type == SQLT_LNG || column.column.type == SQLT_LBI)
             return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) when typeof(" +
                    value + ") = 'blob' and length(" + value + ") > " + std::to_string(kHeldWhole) + " then " + Name() +
@@ -121,6 +124,7 @@ private:
     const PieceList& pieces_;
     ListOfTable read_;
     const bool is_query_;    // else KeepReturned says why there is a plus
+    const bool is_delete_;
     LobStore& store_;
     std::size_t index_ = 0;
     bool uses_alias_ = false;

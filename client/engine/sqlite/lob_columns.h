@@ -1,5 +1,6 @@
 // The columns of a select or returning list that hold large objects, or very long values, of a table's rows. Such an item is rewritten so that
-// SQLite delivers the row's number instead of the value, which then is read where it lies, as far as it is wanted.
+// SQLite delivers the row's number instead of the value, which then is read where it lies, as far as it is wanted. What a
+// delete returns comes as values: its rows are gone by then.
 // Other items, and those of queries over several tables, of groups and the like, come as values.
 #pragma once
 

@@ -143,7 +143,10 @@ SqliteQuery::Reading SqliteQuery::ReadingOf(const Column& column) {
 void SqliteQuery::PlanReading() {
     readings_.clear();
     for (const Column& column : columns_) readings_.push_back(ReadingOf(column));
-    for (const LobItem& lob : lobs_) readings_[lob.index] = Reading::lob;
+    for (const LobItem& lob : lobs_) {
+        const Reading whole = lob.column->kind == LobKind::characters ? Reading::characters : Reading::bytes;
+        readings_[lob.index] = verb_ == Verb::remove ? whole : Reading::lob;
+    }
     rooms_.resize(columns_.size());
     values_.resize(columns_.size());
 }
