@@ -41,14 +41,28 @@ bool Statement::RunsByIteration() const {
 Status Statement::ContinueExecute(ErrorHandle& error) {
     const EndedByException guard(pieces_);
     const ExecuteArguments arguments = pieces_.Arguments();
+    if (!RunsByIteration()) {
+        if (Status status = pieces_.Collect(driver_); !status.Ok()) return status;
+        pieces_.End();
+        return Run(error, arguments);
+    }
+    ub4 row = 0;
+    Status status = RunIterations(row);
+    if (status.Failed() && !Scanned().is_block) error.row_offset = row;
+    if (!status.Ok()) return status;
+    if (!Scanned().is_block) status = Finish(error, arguments);
+    if (status.Ok()) status = std::exchange(told_, {});
+    if (status.Ok() && pieces_.Warned()) status = Warning(errors::kTruncationWarning);
+    return Complete(std::move(status), arguments);
+}
+
+// One after the other, until one waits or fails: `row` is the last one that was begun.
+Status Statement::RunIterations(ub4& row) {
     Status status;
     for (bool stopped = false;;) {
+        row = pieces_.Wanted().iteration;
         if (!pieces_.Delivers()) {
             if (status = pieces_.Collect(driver_); !status.Ok()) return status;
-            if (!RunsByIteration()) {
-                pieces_.End();
-                return Run(error, arguments);
-            }
             if (pieces_.ReturnsToCallbacks()) {
                 if (status = RunAndDeliver(stopped); !status.Ok() && !stopped) return status;
             } else {
@@ -57,15 +71,11 @@ Status Statement::ContinueExecute(ErrorHandle& error) {
             if (stopped) break;
         }
         if (status = pieces_.Deliver(driver_); !status.Ok()) return status;
-        if (pieces_.Wanted().iteration + 1 >= arguments.iterations) break;
+        if (row + 1 >= pieces_.Arguments().iterations) break;
         pieces_.NextIteration();
     }
     pieces_.End();
-    if (status.Failed()) return status;
-    if (!Scanned().is_block) status = Finish(error, arguments);
-    if (status.Ok()) status = std::exchange(told_, {});
-    if (status.Ok() && pieces_.Warned()) status = Warning(errors::kTruncationWarning);
-    return Complete(std::move(status), arguments);
+    return status;
 }
 
 // All values of an iteration are there: runs it. `stopped` when no other follows.

@@ -176,6 +176,7 @@ private:
     // pieces.cpp
     Status StartExecuteInPieces(ErrorHandle& error, const ExecuteArguments& arguments);
     Status ContinueExecute(ErrorHandle& error);
+    Status RunIterations(ub4& row);
     Status RunCollected(bool& stopped);
     Status RunAndDeliver(bool& stopped);
     [[nodiscard]] bool RunsByIteration() const;
