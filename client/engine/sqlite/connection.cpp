@@ -403,6 +403,7 @@ void SqliteConnection::Leave(SqliteQuery& query) noexcept {
 }
 
 Status SqliteConnection::ReadAhead() noexcept {
+    const Unheeding undisturbed(*this);
     Status first;
     for (SqliteQuery* query = first_open_; query;) {
         SqliteQuery* next = query->next_open_;    // reading ahead takes the query off the list

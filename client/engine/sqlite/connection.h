@@ -109,7 +109,8 @@ public:
     void Join(SqliteQuery& query) noexcept;     // the query has rows to come
     void Leave(SqliteQuery& query) noexcept;
     // Lets the open queries but `except` read the rest of their rows, so that none holds an old state of the database.
-    // The first failure, of which the fetch that gets there is told: of interest if it has lost the transaction.
+    // The first failure, of which the fetch that gets there is told: of interest if it has lost the transaction. A stop is
+    // for the call that runs, and does not disturb the queries.
     Status ReadAhead() noexcept;
     [[nodiscard]] bool HasOpenQueries() const { return first_open_ != nullptr; }
     [[nodiscard]] LobStore& LobsOfTables() { return lobs_; }
