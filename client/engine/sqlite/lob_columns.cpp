@@ -106,7 +106,9 @@ private:
     // rows that are gone.
     [[nodiscard]] std::string Number(const TableColumn& column) const {
         const std::string value = Name() + '.' + QuotedName(column.name);
-        if (is_delete_) return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) else " + value + " end";
+        if (is_delete_)
+            return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) else " + value +
+                   " end";
         if (column.column.type == SQLT_LNG || column.column.type == SQLT_LBI)
             return "case when typeof(" + value + ") in ('integer', 'real') then cast(" + value + " as text) when typeof(" +
                    value + ") = 'blob' and length(" + value + ") > " + std::to_string(kHeldWhole) + " then " + Name() +

@@ -349,7 +349,8 @@ void LobStore::Note(Table& table, std::int64_t row, int operation) noexcept {
             return;
         }
         if (operation == SQLITE_INSERT) change.replaced_at = now_;
-        if (operation == SQLITE_UPDATE) change.replaced_at = std::max({change.replaced_at, change.gone_at, table.emptied_at});
+        if (operation == SQLITE_UPDATE)
+            change.replaced_at = std::max({change.replaced_at, change.gone_at, table.emptied_at});
         change.at = now_;
         change.transaction = transaction_;
     } catch (const std::bad_alloc&) {

@@ -310,7 +310,8 @@ Status SqliteQuery::ExecuteRow(RowSource& source, std::uint32_t row, RowSink* re
     const auto changes = static_cast<std::uint64_t>(sqlite3_changes64(connection_.Database()));
     affected += changes;
     // "delete from t" deletes all rows at once and tells of none.
-    if (verb_ == Verb::remove && changes > 0 && connection_.ToldChanges() == told) connection_.LobsOfTables().RowsGone(table_);
+    if (verb_ == Verb::remove && changes > 0 && connection_.ToldChanges() == told)
+        connection_.LobsOfTables().RowsGone(table_);
     return status;
 }
 
