@@ -47,18 +47,18 @@ Status PgConnection::Stopped() { return Refused(errors::kCancelled); }
 Status PgConnection::Enter() {
     if (wire_->Broken()) return wire_->Lost();
     if (streaming_) streaming_->ReadAhead();
-    if (wire_->Broken()) return Refused(errors::kEndOfChannel, "the connection to the server was lost");    // by this call
+    if (wire_->Broken()) return wire_->Loss();
     if (!wire_->Idle()) return Refused(errors::kInternalError, "a batch is under way");
     if (!path_stands_) {
         if (Status status = SetPath(); !status.Ok()) return status;
     }
     const bool forgets = forgotten_.size() >= kForgottenAtOnce && !in_transaction_;    // a failure would end it
-    if (!forgets) return wire_->Broken() ? wire_->Lost() : Status();
+    if (!forgets) return wire_->Loss();
     for (const std::string& command : forgotten_) wire_->Send(command.c_str());
     wire_->Sync();
     forgotten_.clear();
     (void)wire_->Drain();
-    return wire_->Broken() ? wire_->Lost() : Status();
+    return wire_->Loss();
 }
 
 Status PgConnection::Enter(Effect effect) {
@@ -140,6 +140,7 @@ void PgConnection::SendRelease(Guard guard) noexcept {
 Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
     const Wire::Heeding undisturbed(*wire_, false);
     Note();
+    if (!status.Ok()) status = wire_->OrLoss(std::move(status));
     if (status.Ok() || !in_transaction_) return guard == Guard::savepoint && status.Failed() ? Undone(status) : status;
     if (guard == Guard::savepoint) {
         wire_->Send(kUndoGuard);
@@ -153,7 +154,7 @@ Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
     if (guard == Guard::none && wire_->Transaction() == PQTRANS_INTRANS) return status;
     (void)wire_->Run("rollback");
     Note();
-    return guard == Guard::none ? Undone(status) : status;
+    return guard == Guard::none ? Undone(status) : wire_->OrLoss(std::move(status));
 }
 
 // The server has given the transaction up with a failure.
@@ -163,7 +164,7 @@ Status PgConnection::Lose(const Status& failure) noexcept {
     return Undone(failure);
 }
 
-Status PgConnection::Undone(const Status& failure) noexcept { return loss_ = RolledBack(failure); }
+Status PgConnection::Undone(const Status& failure) noexcept { return loss_ = RolledBack(wire_->OrLoss(failure)); }
 
 Status PgConnection::DropGuard() noexcept { return wire_->Run(kDropGuard); }
 

@@ -157,7 +157,7 @@ Status PgQuery::PrepareTyped(std::uint32_t& error_offset) {
         }
         if (told == types) return status;
         Status again = PrepareAs(told, error_offset);
-        return again.Ok() ? again : status;
+        return again.Ok() ? again : connection_.Server().OrLoss(std::move(status));
     }
     if (!status.Ok()) return status;
     const bool retypes = RetypesTimes(types);
@@ -367,7 +367,8 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
         Batch batch;
         const bool whole = row >= singly && !delivers && stop == run.last && PrepareWhole(run.last - row);
-        if (was_in_transaction && !connection_.InTransaction()) return server.Broken() ? server.Lost() : connection_.Loss();
+        if (was_in_transaction && !connection_.InTransaction()) return connection_.Loss();
+        if (server.Broken()) return server.Loss();
         if (whole) {
             batch = TryWhole(source, row, run.last);
             singly = row + std::max(batch.sent, 1U);
@@ -379,7 +380,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         if (batch.refusal.Number() == errors::kCancelled) stop = row + batch.sent;
         stop = batch.stop.value_or(stop);
         Status failure = batch.failure;
-        while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction) {
+        while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction && !server.Broken()) {
             const std::uint32_t before = batch.done;
             batch = RunBatch(source, row, row + before, false);
             if (batch.failure.Ok() && batch.sent == before) break;    // it is the row behind them that fails

@@ -82,7 +82,7 @@ PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std
     if (batch.sent == 0) return batch;
     Status failure = ReadReturning(guard, heeds, batch, results);
     connection_.Note();    // that a transaction has begun
-    std::uint32_t kept = batch.done;
+    std::uint32_t kept = connection_.Server().Broken() ? 0 : batch.done;
     Status ended = UndoRows(kept, batch);
     for (std::uint32_t row = 0; row < kept && ended.Ok(); ++row) {
         Status status = Deliver(results[row].get(), first + row, sink);

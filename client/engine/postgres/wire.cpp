@@ -233,14 +233,18 @@ Status Wire::Answer(const PGresult* result, Verb verb) noexcept {
     const bool fatal = severity && (std::strcmp(severity, "FATAL") == 0 || std::strcmp(severity, "PANIC") == 0);
     broken_ = broken_ || fatal || PQstatus(connection_) == CONNECTION_BAD;
     if (!broken_) return Failure(result, verb);
-    lost_told_ = true;
     const char* words = PQresultErrorField(result, PG_DIAG_MESSAGE_PRIMARY);
-    return Refused(errors::kEndOfChannel, words ? words : "the connection to the server was lost");
+    return loss_ = Refused(errors::kEndOfChannel, words ? words : "the connection to the server was lost");
 }
 
 Status Wire::Lost() noexcept {
-    if (std::exchange(lost_told_, true)) return Refused(errors::kNotConnected);
-    return Refused(errors::kEndOfChannel, "the connection to the server was lost");
+    if (!loss_.Ok()) return Refused(errors::kNotConnected);
+    return loss_ = Refused(errors::kEndOfChannel, "the connection to the server was lost");
+}
+
+const Status& Wire::Loss() noexcept {
+    if (broken_ && loss_.Ok()) (void)Lost();
+    return loss_;
 }
 
 // That the connection was lost is told when the batch is drained.

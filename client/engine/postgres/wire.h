@@ -88,6 +88,10 @@ public:
     // The status of an error's result, or of the connection that was lost with it.
     Status Answer(const PGresult* result, Verb verb = Verb::other) noexcept;
     Status Lost() noexcept;    // 3113 the first time, 3114 then
+    // Of a call that began with a connection: that 3113, once it is lost.
+    const Status& Loss() noexcept;
+    // The same where it was told to somebody; the status where it was not.
+    [[nodiscard]] Status OrLoss(Status status) const noexcept { return loss_.Ok() ? std::move(status) : loss_; }
 
     // ---- Stopping
     void Obey(std::shared_ptr<const StopRequest> stop) noexcept { stop_ = std::move(stop); }
@@ -140,7 +144,7 @@ private:
     bool open_ = false;         // something was sent behind the last Sync
     bool heeds_ = false;
     bool broken_ = false;
-    bool lost_told_ = false;
+    Status loss_;               // the 3113, once it was told
     bool short_of_memory_ = false;    // something could not be sent
 };
 

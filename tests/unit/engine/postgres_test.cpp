@@ -144,9 +144,20 @@ TEST_F(Postgres, ServerThatGoesAway) {
         connection_ = Connect();
         EXPECT_EQ(Query("select count(*) from t"), "3000;") << name;
     }
-    insert = Prepared("insert into t values(%1) returning pg_terminate_backend(pg_backend_pid())", std::vector{Integer(1)});
-    EXPECT_EQ(Answer(insert->ExecuteArray(many, {0, 20, false, &rows}, outcome)), 3113) << "in the middle";
-    EXPECT_EQ(rows.text, "");
+    // In the middle, behind rows that are done.
+    MustCommit("create function goes() returns trigger language plpgsql as 'begin perform"
+               " pg_terminate_backend(pg_backend_pid()) where (select count(*) from t) = 3003; return new; end'",
+               "create trigger goes before insert on t for each row execute function goes()");
+    for (const char* const sql : {"insert into t values(%1)", "insert into t values(%1 + 0)", "insert into t values(%1) returning n"}) {
+        for (const std::uint32_t last : {6U, 20U}) {
+            insert = Prepared(sql, std::vector{Integer(1)});
+            const Status status = insert->ExecuteArray(many, {0, last, false, &rows}, outcome);
+            EXPECT_EQ(std::to_string(Answer(status)) + status.Detail(), "3113terminating connection due to administrator command") << sql << last;
+            insert.reset();
+            connection_ = Connect();
+        }
+    }
+    EXPECT_EQ(rows.text + Query("select count(*) from t"), "3000;");
 }
 
 TEST_F(Postgres, StopIsHeededBehindSignals) {
