@@ -106,7 +106,7 @@ void PgConnection::Note() noexcept {
     }
     if (before && !in_transaction_) {
         lobs_->Forget();
-        SomethingUndone();
+        SomethingUndone(0);
         path_may_go_ = changed_ = false;
     }
     if (in_transaction_) return;
@@ -137,7 +137,7 @@ void PgConnection::SendRelease(Guard guard) noexcept {
     wire_->Sync();
 }
 
-Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
+Status PgConnection::Settle(Guard guard, Status status, std::uint64_t since) noexcept {
     const Wire::Heeding undisturbed(*wire_, false);
     Note();
     if (!status.Ok()) status = wire_->OrLoss(std::move(status));
@@ -147,7 +147,7 @@ Status PgConnection::Settle(Guard guard, Status status, bool ran) noexcept {
         wire_->Send(kDropGuard);
         wire_->Sync();
         const Status undone = wire_->Drain();
-        if (ran) SomethingUndone();
+        if (since != kNothing) SomethingUndone(since);
         Note();
         return undone.Ok() ? status : Lose(status);
     }
@@ -348,7 +348,7 @@ Status PgConnection::SetMark() {
     wire_->Send(command.text);
     wire_->Sync();
     Status status = Settle(guard, wire_->Drain());
-    if (status.Ok()) savepoints_.push_back({{}, marks_});
+    if (status.Ok()) savepoints_.push_back({{}, marks_, lobs_->Now()});
     return status;
 }
 
@@ -357,7 +357,7 @@ Status PgConnection::UndoToMark() {
     if (mark == savepoints_.size()) return Refused(errors::kNoSuchSavepoint);
     if (Status status = Enter(); !status.Ok()) return status;
     lobs_->Forget();
-    SomethingUndone();
+    SomethingUndone(savepoints_[mark].at);
     Status status = wire_->Run(MarkText("rollback to savepoint", savepoints_[mark].mark).text);
     Note();
     if (!status.Ok()) return Lose(status);
@@ -423,13 +423,13 @@ Status PgConnection::CheckSavepoint(const SavepointCommand& command) {
 
 // The server has done it: what stands behind a savepoint is gone with it.
 void PgConnection::NoteSavepoint(const SavepointCommand& command) {
-    if (command.verb == SavepointCommand::Verb::undo) SomethingUndone();
     if (command.verb == SavepointCommand::Verb::set) {
-        savepoints_.push_back({command.name, 0});
+        savepoints_.push_back({command.name, 0, lobs_->Now()});
         return;
     }
     const auto found = std::find_if(savepoints_.rbegin(), savepoints_.rend(),
                                     [&](const Savepoint& savepoint) { return savepoint.name == command.name; });
+    if (command.verb == SavepointCommand::Verb::undo) SomethingUndone(found->at);
     ForgetLockWait();
     const auto kept = found.base() - (command.verb == SavepointCommand::Verb::drop ? 1 : 0);
     savepoints_.erase(kept, savepoints_.end());

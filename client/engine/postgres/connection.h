@@ -94,8 +94,9 @@ public:
     // Sends what stands behind it and closes the batch.
     void SendRelease(Guard guard) noexcept;
     // Once the batch is read: goes back to where the guard stood if it has failed, and tells whether the transaction was
-    // lost with it. `ran`: the statement did more than to be prepared, so that there may be something to undo.
-    Status Settle(Guard guard, Status status, bool ran = true) noexcept;
+    // lost with it. What the transaction did behind the moment `since` of the large objects is undone then.
+    static constexpr std::uint64_t kNothing = ~std::uint64_t{0};
+    Status Settle(Guard guard, Status status, std::uint64_t since = kNothing) noexcept;
     [[nodiscard]] const Status& Loss() const { return loss_; }    // what took the last transaction with it
     // Ends the savepoint of a statement whose batch ended before it.
     Status DropGuard() noexcept;
@@ -110,7 +111,7 @@ public:
     void NoteSavepoint(const SavepointCommand& command);
 
     void Note() noexcept;    // what the server says of the transaction
-    void SomethingUndone() noexcept;      // some of it, or all
+    void SomethingUndone(std::uint64_t since) noexcept;    // behind that moment; 0: all of it
     void NoteChange() noexcept { changed_ = in_transaction_; }    // rows were changed in it
 
     // Names that prepared statements have on this connection, and the end of one.
@@ -144,6 +145,7 @@ private:
     struct Savepoint {
         std::string name;         // empty: a mark
         unsigned mark = 0;        // its number, which stands in the server's name for it
+        std::uint64_t at = 0;     // its moment
     };
     std::vector<Savepoint> savepoints_;    // from the outermost
     unsigned marks_ = 0;

@@ -53,8 +53,8 @@ Status PgConnection::SetPath() {
 }
 
 // Some of the transaction, or all of it.
-void PgConnection::SomethingUndone() noexcept {
-    lobs_->Undone();
+void PgConnection::SomethingUndone(std::uint64_t since) noexcept {
+    lobs_->Undone(since);
     if (path_may_go_) path_stands_ = false;
 }
 

@@ -262,6 +262,7 @@ void PgLobStore::Follow(std::shared_ptr<LobRow>& row, const RowVersion& version,
     if (const auto found = rows_.find(version); found != rows_.end()) other = found->second.lock();
     if (other && other != row) {
         other->versions.insert(other->versions.begin(), row->versions.begin(), row->versions.end());
+        Hold(*other, row->anchor, row->held_at);
         row = std::move(other);
     }
     std::erase(row->versions, version);
@@ -269,6 +270,36 @@ void PgLobStore::Follow(std::shared_ptr<LobRow>& row, const RowVersion& version,
     room.key() = version;
     room.mapped() = row;
     if (auto known = rows_.insert(std::move(room)); !known.inserted) known.position->second = row;
+}
+
+// The first one that stands outlasts the others: what undoes it undoes those behind it.
+void PgLobStore::Hold(LobRow& row, const RowVersion& version, std::uint64_t at) noexcept {
+    if (!Stands(at) || (Stands(row.held_at) && row.held_at <= at)) return;
+    row.anchor = version;
+    row.held_at = at;
+    last_held_at_ = std::max(last_held_at_, at);
+}
+
+bool PgLobStore::Stands(std::uint64_t at) const noexcept {
+    if (at == 0 || at < all_undone_at_) return false;
+    const auto behind = std::upper_bound(undone_.begin(), undone_.end(), at,
+                                         [](std::uint64_t moment, const Stretch& stretch) { return moment < stretch.until; });
+    return behind == undone_.end() || behind->since >= at;
+}
+
+// Stretches that meet where nothing was held are one, so that rows that fail in a row need no room.
+void PgLobStore::Undone(std::uint64_t since) noexcept try {
+    ++object_changes_;
+    ++now_;
+    const auto joins = [&](const Stretch& last) {
+        return last.since >= since || (last.until >= since && last_held_at_ < since);
+    };
+    for (; !undone_.empty() && joins(undone_.back()); undone_.pop_back()) since = std::min(since, undone_.back().since);
+    if (since > 0) undone_.push_back({since, now_});
+    else all_undone_at_ = now_;
+} catch (const std::bad_alloc&) {
+    undone_.clear();
+    all_undone_at_ = now_;
 }
 
 // Rows that nobody holds are forgotten once in a while.
@@ -305,8 +336,8 @@ Status PgLobStore::WhyMissing(const RowVersion& version) {
     return Refused(status.Ok() && PQntuples(found.get()) > 0 ? errors::kSnapshotTooOld : errors::kNoLobValue);
 }
 
-// Updates by the transaction are followed from the versions that are known. Behind an undoing only those that are known
-// count: places that it has freed may be others' by now.
+// The server follows updates from one version to the next. It does so from any that is known, but what it finds is the row
+// only if it started from the anchor: where others lay that are undone, or were not locked, other rows may lie by now.
 Status PgLobStore::FindLatest(const LobColumn& column, const LobRow& row, bool follows, RowVersion& latest,
                               std::uint64_t& measure) {
     const Oid oid = latest.table;
@@ -314,23 +345,26 @@ Status PgLobStore::FindLatest(const LobColumn& column, const LobRow& row, bool f
     if (Status status = connection_.TableOf(oid, table); !status.Ok()) return status;
     std::string places;
     for (const RowVersion& version : row.versions) places += (places.empty() ? "\"" : ",\"") + PlaceText(version) + '"';
-    const Question question({"{" + places + "}", table->name});
+    const bool has_anchor = follows && Stands(row.held_at);
+    const Question question({"{" + places + "}", table->name, has_anchor ? PlaceText(row.anchor) : "(0,0)"});
     const std::string sql =
         "with kelp_v(place) as (select pg_catalog.unnest($1::tid[])) select ctid, xmin::text::bigint, " +
-        MeasureOf(column, column.name, connection_.Server().ServerHasUtf8()) + "::bigint from only " + table->name +
+        MeasureOf(column, column.name, connection_.Server().ServerHasUtf8()) + "::bigint, "
+        "ctid = case when $3::tid <> '(0,0)' then pg_catalog.currtid2($2::text, $3::tid) end from only " + table->name +
         " where ctid = any(array(select place from kelp_v union select pg_catalog.currtid2($2::text, place) from kelp_v))";
     Result found;
     Status status = connection_.AskGuarded(sql, question.values, found);
     const bool says_why = connection_.Server().Broken() || !connection_.InTransaction() || IsPassing(status);
     if (!status.Ok()) return says_why ? status : Refused(errors::kNoLobValue);
-    int fits = -1, next = -1;
+    int fits = -1, next = -1, other = -1;
     for (int index = 0; index < PQntuples(found.get()); ++index) {
         const RowVersion version = VersionIn(found, index, 0, oid);
         const bool is_known = std::find(row.versions.begin(), row.versions.end(), version) != row.versions.end();
-        (is_known ? fits : next) = index;
+        const bool is_of_anchor = !PQgetisnull(found.get(), index, 3) && *PQgetvalue(found.get(), index, 3) != 0;
+        (is_known ? fits : is_of_anchor ? next : other) = index;
     }
-    if (fits < 0 && follows && row.checked_at >= undone_at_) fits = next;
-    if (fits < 0) return Refused(next < 0 ? errors::kNoLobValue : errors::kSnapshotTooOld);
+    if (fits < 0) fits = next;
+    if (fits < 0) return Refused(other < 0 ? errors::kNoLobValue : errors::kSnapshotTooOld);
     if (PQgetisnull(found.get(), fits, 2)) return Refused(errors::kNoLobValue);
     latest = VersionIn(found, fits, 0, oid);
     measure = static_cast<std::uint64_t>(Get<std::int64_t>(PQgetvalue(found.get(), fits, 2)));
@@ -366,7 +400,7 @@ Lob* PgLobStore::FindDraft(const LobRow& row, const LobColumn& column) {
 
 void PgLobStore::Forget() noexcept {
     drafts_.clear();
-    Undone();
+    ++now_;
 }
 
 Status PgLobStore::Settle() {
@@ -448,8 +482,9 @@ Status PgLobStore::Update(Draft& draft, const std::string& expression, std::stri
     Result changed;
     if (Status status = connection_.AskGuarded(sql, question.values, changed); !status.Ok()) return status;
     if (PQntuples(changed.get()) != 1) return Refused(errors::kNoLobValue);
-    Follow(draft.row, VersionIn(changed, 0, 0, version.table), std::move(room));
-    draft.row->checked_at = now_ + 1;    // behind the settling
+    const RowVersion made = VersionIn(changed, 0, 0, version.table);
+    Follow(draft.row, made, std::move(room));
+    Hold(*draft.row, made, now_ + 1);    // behind the settling
     return {};
 }
 

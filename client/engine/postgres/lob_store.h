@@ -35,7 +35,10 @@ struct RowVersionHash {
 // What is known of one row.
 struct LobRow {
     std::vector<RowVersion> versions;    // that it had; the last one known comes last
-    std::uint64_t checked_at = 0;        // when the last one was seen to be the row's
+    // The version that the transaction has locked or made first, and when that was known. As long as this is not undone,
+    // nobody else changes the row, and the version stays where it lies.
+    RowVersion anchor;
+    std::uint64_t held_at = 0;           // 0: there is none
 };
 
 // The value of a Datum of Kind::lob; the bytes follow where they came with the row.
@@ -46,7 +49,7 @@ struct LobView {
     bool is_whole = false;       // its bytes follow
     Oid object = 0;              // the number of one that the server keeps for itself, which has no length here
     std::uint64_t length = 0;
-    std::uint64_t seen_at = 0;
+    std::uint64_t seen_at = 0;   // when the row was read
 };
 
 class PgLobStore final : public LobStore {
@@ -62,14 +65,11 @@ public:
     // ---- For the connection
 
     [[nodiscard]] std::uint64_t Now() const { return now_; }    // another number behind each statement
-    void StatementRuns() noexcept { ++now_; }
+    std::uint64_t StatementRuns() noexcept { return ++now_; }
     // Drafts become values. The values of drafts that fail stay as they were; where memory failed, the drafts wait.
     Status Settle();
     void Forget() noexcept;                 // the drafts: what they are of is undone, or part of it
-    void Undone() noexcept {                // some of the transaction, not its drafts
-        undone_at_ = ++now_;
-        ++object_changes_;
-    }
+    void Undone(std::uint64_t since) noexcept;    // what the transaction did behind that moment, not its drafts
     void TransactionBegins() noexcept { ++transaction_; }
 
 private:
@@ -92,6 +92,9 @@ private:
     Rows::node_type MakeRoom(LobRow& row);
     void Follow(std::shared_ptr<LobRow>& row, const RowVersion& version, Rows::node_type room);
     void Sweep();
+    // The transaction was seen to have the row of that version then.
+    void Hold(LobRow& row, const RowVersion& version, std::uint64_t at) noexcept;
+    [[nodiscard]] bool Stands(std::uint64_t at) const noexcept;    // what it did then is not undone
     Lob* FindDraft(const LobRow& row, const LobColumn& column);
     Status Flush(Draft& draft);
     Status Upload(Lob& value, std::uint64_t length, Oid& object);
@@ -100,7 +103,7 @@ private:
     // Questions to the server, about versions of a row.
     Status ReadVersion(const LobColumn& column, const RowVersion& version, std::uint64_t offset, std::size_t most,
                        Result& found);
-    // `follows`: a version that is not known is one if it has come of those that are.
+    // `follows`: a version that is not known is one if it has come of the anchor.
     Status FindLatest(const LobColumn& column, const LobRow& row, bool follows, RowVersion& latest,
                       std::uint64_t& measure);
     Status HasWritten(const RowVersion& version, bool& written);
@@ -118,7 +121,12 @@ private:
     std::uint64_t now_ = 1;
     std::uint64_t writes_ = 0;            // into drafts
     std::uint64_t object_changes_ = 0;    // of objects that the server keeps for itself: writes, and what undid them
-    std::uint64_t undone_at_ = 0;
+    struct Stretch {
+        std::uint64_t since, until;       // neither belongs to it
+    };
+    std::vector<Stretch> undone_;         // in their order, apart from each other
+    std::uint64_t all_undone_at_ = 0;
+    std::uint64_t last_held_at_ = 0;
 };
 
 }  // namespace engine::postgres

@@ -195,7 +195,7 @@ Status PgQuery::SendPrepared(const std::string& name, const std::string& text, c
         } else description = std::move(result);
     }
     Status rest = server.Drain();
-    return connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status), false);
+    return connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
 }
 
 // Throws before anything is changed, or the query is none.
@@ -294,7 +294,8 @@ bool PgQuery::LoadForBatch(RowSource& source, std::uint32_t row, bool heeds, Bat
 
 // Before the statement is sent: what was known of rows before may be so no more.
 PgConnection::Guard PgQuery::Begin(bool needs) noexcept {
-    connection_.Large().StatementRuns();
+    since_ = connection_.Large().Now();
+    ran_at_ = connection_.Large().StatementRuns();
     return connection_.SendGuard(needs);
 }
 
@@ -328,7 +329,7 @@ Status PgQuery::ExecuteOnce(RowSource& source, std::uint32_t row, ArrayOutcome& 
         const Wire::Heeding heeding(server);
         status = connection_.PassGuard(guard);
         Status rest = server.Drain();
-        status = connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status));
+        status = connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status), since_);
     }
     if (status.Ok()) ++outcome.executed;
     return status;
@@ -433,7 +434,7 @@ PgQuery::Batch PgQuery::RunBatch(RowSource& source, std::uint32_t first, std::ui
     const bool all_done = batch.failure.Ok();
     Status rest = server.Drain();
     if (all_done) batch.failure = std::move(rest);
-    batch.failure = connection_.Settle(guard, std::move(batch.failure));
+    batch.failure = connection_.Settle(guard, std::move(batch.failure), since_);
     if (all_done && !batch.failure.Ok()) batch.done = 0;    // the end of the batch has failed: none of its rows is to blame
     return batch;
 }

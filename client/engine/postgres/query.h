@@ -94,7 +94,7 @@ private:
     Batch RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, RowSink& sink);
     PgConnection::Guard SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, Batch& batch);
     Status ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Result>& results) noexcept;
-    Status UndoRows(std::uint32_t row, const Batch& batch) noexcept;
+    Status UndoRows(std::uint32_t row, const Batch& batch, std::uint64_t since) noexcept;
     Status ReleaseRows(PgConnection::Guard guard, const Batch& batch) noexcept;
     Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);
 
@@ -125,6 +125,8 @@ private:
     std::vector<bool> makes_object_;       // by placeholder; shorter or empty: the others do not
     std::string_view tail_;                // what the server is told behind the statement
     std::string name_;                     // empty: the server has it not
+    std::uint64_t since_ = 0;              // when it was executed, as large objects count; what it did is behind that
+    std::uint64_t ran_at_ = 0;             // when what it returns was as it is
     BoundValues bound_;
     std::vector<Datum> parameters_;
     enum class Whole : std::uint8_t { unknown, impossible, ready } whole_ = Whole::unknown;

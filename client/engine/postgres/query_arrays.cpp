@@ -83,7 +83,7 @@ bool PgQuery::MakeWhole() {
     connection_.SendRelease(guard);
     Status status = connection_.PassGuard(guard);
     Status rest = server.Drain();
-    if (!connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status), false).Ok()) return false;
+    if (!connection_.Settle(guard, status.Ok() ? std::move(rest) : std::move(status)).Ok()) return false;
     whole_name_ = std::move(name);
     whole_ = Whole::ready;
     return true;
@@ -146,7 +146,7 @@ PgQuery::Batch PgQuery::RunWhole(RowSource& source, std::uint32_t first, std::ui
     }
     Status rest = server.Drain();
     if (batch.failure.Ok()) batch.failure = std::move(rest);
-    batch.failure = connection_.Settle(guard, std::move(batch.failure));
+    batch.failure = connection_.Settle(guard, std::move(batch.failure), since_);
     return batch;
 }
 

@@ -61,10 +61,10 @@ Status PgQuery::ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batc
 }
 
 // The rows from that one on. Of the first one it is the statement that is undone.
-Status PgQuery::UndoRows(std::uint32_t row, const Batch& batch) noexcept {
+Status PgQuery::UndoRows(std::uint32_t row, const Batch& batch, std::uint64_t since) noexcept {
     if (row == 0 || row == batch.sent) return {};
     const Wire::Heeding undisturbed(connection_.Server(), false);
-    connection_.SomethingUndone();
+    connection_.SomethingUndone(since);
     return connection_.Server().Run(RowCommand("rollback to savepoint", row).text);
 }
 
@@ -83,8 +83,10 @@ PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std
     Status failure = ReadReturning(guard, heeds, batch, results);
     connection_.Note();    // that a transaction has begun
     std::uint32_t kept = connection_.Server().Broken() ? 0 : batch.done;
-    Status ended = UndoRows(kept, batch);
+    Status ended = UndoRows(kept, batch, since_);
     for (std::uint32_t row = 0; row < kept && ended.Ok(); ++row) {
+        const std::uint64_t before = connection_.Large().Now();
+        ran_at_ = connection_.Large().StatementRuns();    // which may have changed the rows of those before
         Status status = Deliver(results[row].get(), first + row, sink);
         if (status.Ok()) {
             batch.affected += AffectedBy(results[row].get());
@@ -92,11 +94,10 @@ PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std
         }
         failure = std::move(status);
         kept = row;
-        ended = UndoRows(kept, batch);
+        ended = UndoRows(kept, batch, before);
     }
-    if (kept > 1) connection_.Large().StatementRuns();    // which may have changed the rows of those before
     if (ended.Ok()) ended = kept == 0 ? failure : ReleaseRows(guard, batch);
-    ended = connection_.Settle(guard, std::move(ended));
+    ended = connection_.Settle(guard, std::move(ended), since_);
     if (!ended.Ok()) {    // nothing of it is left
         kept = 0;
         batch.affected = 0;

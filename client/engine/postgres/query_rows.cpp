@@ -73,7 +73,7 @@ Status PgQuery::Finish(Status status) noexcept {
     Status rest = connection_.Server().Drain();
     connection_.Stream(nullptr);
     state_ = State::drained;
-    return connection_.Settle(guard_, status.Ok() ? std::move(rest) : std::move(status));
+    return connection_.Settle(guard_, status.Ok() ? std::move(rest) : std::move(status), since_);
 }
 
 Status PgQuery::CheckOpen() {
@@ -216,7 +216,7 @@ void PgQuery::Leave() noexcept {
     Status rest = server.Drain();
     connection_.Stream(nullptr);
     state_ = State::drained;
-    (void)connection_.Settle(guard_, std::move(rest));
+    (void)connection_.Settle(guard_, std::move(rest), since_);
 }
 
 Status PgQuery::Scroll(std::uint64_t position, RowSink& sink, bool& found) {
@@ -300,7 +300,7 @@ Status PgQuery::FillLobs(const PGresult* result, int row) {
         if (Status status = FindPlace(result, row, view.version); !status.Ok()) return status;
     }
     view.is_locked = effect_ == Effect::locks || effect_ == Effect::changes;
-    view.seen_at = connection_.Large().Now();
+    view.seen_at = ran_at_;
     for (std::size_t index = 0; index < lobs_.size(); ++index) {
         Datum& value = at_hand_.values[lobs_[index].index];
         const int field = static_cast<int>(at_hand_.values.size() + index);

@@ -13,8 +13,8 @@ RowLob::RowLob(PgLobStore& store, const LobView& view)
 void RowLob::Keep(const LobView& view) {
     if (view.version.table == 0) return;
     row_ = Store().RowOf(view.version);
-    row_->checked_at = std::max(row_->checked_at, view.seen_at);
     is_current_ = transaction_ != 0 && view.is_locked;
+    if (is_current_) Store().Hold(*row_, view.version, view.seen_at);
 }
 
 bool RowLob::InItsTransaction() const { return Store().InTransaction(transaction_); }
@@ -24,6 +24,7 @@ Status RowLob::CheckWrite() {
     if (!shared_->store) return Error(errors::kInvalidLocator);
     if (!is_current_ && row_ && InItsTransaction()) {
         if (Status status = Store().HasWritten(version_, is_current_); status.Failed()) return status;
+        if (is_current_) Store().Hold(*row_, version_, Store().Now());
     }
     if (!is_current_) return Refused(errors::kRowNotLocked);
     if (!InItsTransaction()) return Refused(errors::kLocatorOfOldTransaction);
@@ -34,7 +35,7 @@ Status RowLob::FindLatest(bool follows, RowVersion& latest, std::uint64_t& measu
     latest = row_->versions.back();
     if (Status status = Store().FindLatest(*column_, *row_, follows, latest, measure); status.Failed()) return status;
     Store().Follow(row_, latest, Store().MakeRoom(*row_));
-    seen_at_ = row_->checked_at = Store().Now();
+    seen_at_ = Store().Now();
     return {};
 }
 
