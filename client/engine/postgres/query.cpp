@@ -365,6 +365,7 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
     bool renewed = false;
     for (std::uint32_t row = run.first; row < run.last;) {
         const bool was_in_transaction = connection_.InTransaction();
+        const std::size_t told = server.Told();
         const std::uint32_t last = std::min(stop, row + std::min(run.last - row, size));
         Batch batch;
         const bool whole = row >= singly && !delivers && stop == run.last && PrepareWhole(run.last - row);
@@ -374,7 +375,10 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
             batch = TryWhole(source, row, run.last);
             singly = row + std::max(batch.sent, 1U);
             if (batch.refusal.Number() == errors::kCancelled) stop = singly;
-            if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !server.Broken()) continue;
+            if (!batch.failure.Ok() && connection_.InTransaction() == was_in_transaction && !server.Broken()) {
+                server.Untell(told, server.Told());
+                continue;
+            }
         } else if (row == stop) batch.refusal = PgConnection::Stopped();
         else if (delivers) batch = RunReturning(source, row, last, stop == run.last, *run.returned);
         else batch = RunBatch(source, row, last, stop == run.last);
@@ -383,8 +387,15 @@ Status PgQuery::ExecuteRows(RowSource& source, const ArrayRun& run, ArrayOutcome
         Status failure = batch.failure;
         while (!failure.Ok() && batch.done > 0 && connection_.InTransaction() == was_in_transaction && !server.Broken()) {
             const std::uint32_t before = batch.done;
+            server.Untell(told, batch.told);
+            const std::size_t own = server.Told() - std::min(told, server.Told());    // of the row that fails
             batch = RunBatch(source, row, row + before, false);
-            if (batch.failure.Ok() && batch.sent == before) break;    // it is the row behind them that fails
+            if (batch.failure.Ok() && batch.sent == before) {    // it is the row behind them that fails
+                server.TellLast(told, told + own);
+                break;
+            }
+            server.Untell(told, told + own);
+            batch.told -= std::min(own, batch.told);
             failure = batch.failure;
         }
         if (batch.failure.Ok()) {
@@ -441,11 +452,14 @@ PgQuery::Batch PgQuery::RunBatch(RowSource& source, std::uint32_t first, std::ui
 
 void PgQuery::ReadBatch(Batch& batch) noexcept {
     Wire& server = connection_.Server();
+    batch.told = server.Told();
     while (batch.done < batch.sent && batch.failure.Ok()) {
         const Result result = server.Next();
         if (server.Broken() && !result) return;
-        if (!result) ++batch.done;
-        else if (IsFailure(result.get())) batch.failure = server.Answer(result.get(), verb_);
+        if (!result) {
+            ++batch.done;
+            batch.told = server.Told();
+        } else if (IsFailure(result.get())) batch.failure = server.Answer(result.get(), verb_);
         else {
             batch.affected += AffectedBy(result.get());
             const int rows = tail_.empty() ? 0 : PQntuples(result.get());

@@ -51,11 +51,17 @@ private:
         std::uint32_t sent = 0;        // rows
         std::uint32_t done = 0;        // of them, before the one that failed
         std::uint64_t affected = 0;
+        std::size_t told = 0;          // notices, up to those of the rows that are done
         Status failure;                // of the row behind them, or of the batch
         std::optional<RowId> last_row;
         bool refused = false;          // the row behind those that were sent: by its source, or by a stop
         Status refusal;
         std::optional<std::uint32_t> stop;    // the row that a stop was met at, in the whole array
+    };
+
+    struct Returned {
+        Result rows;
+        std::size_t told = 0;          // notices up to there
     };
 
     Status PrepareTyped(std::uint32_t& error_offset);
@@ -93,7 +99,7 @@ private:
     void ReadBatch(Batch& batch) noexcept;
     Batch RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, RowSink& sink);
     PgConnection::Guard SendReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, Batch& batch);
-    Status ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Result>& results) noexcept;
+    Status ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Returned>& results) noexcept;
     Status UndoRows(std::uint32_t row, const Batch& batch, std::uint64_t since) noexcept;
     Status ReleaseRows(PgConnection::Guard guard, const Batch& batch) noexcept;
     Status Deliver(const PGresult* result, std::uint32_t row, RowSink& sink);

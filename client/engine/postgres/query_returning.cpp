@@ -39,7 +39,7 @@ PgConnection::Guard PgQuery::SendReturning(RowSource& source, std::uint32_t firs
 }
 
 // The failure is of the row behind those that are done.
-Status PgQuery::ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Result>& results) noexcept {
+Status PgQuery::ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batch, std::vector<Returned>& results) noexcept {
     Wire& server = connection_.Server();
     const Wire::Heeding heeding(server, heeds && !batch.refused);
     Status failure = connection_.PassGuard(guard);
@@ -49,10 +49,10 @@ Status PgQuery::ReadReturning(PgConnection::Guard guard, bool heeds, Batch& batc
         if (!failure.Ok()) break;
         for (Result result = server.Next(); result; result = server.Next()) {
             if (IsFailure(result.get())) failure = server.Answer(result.get(), verb_);
-            else results[batch.done] = std::move(result);
+            else results[batch.done].rows = std::move(result);
         }
         if (server.Broken() && failure.Ok()) failure = server.Lost();
-        if (failure.Ok()) ++batch.done;
+        if (failure.Ok()) results[batch.done++].told = server.Told();
     }
     Status rest = server.Drain();
     if (!failure.Ok() || rest.Ok()) return failure;
@@ -76,24 +76,26 @@ Status PgQuery::ReleaseRows(PgConnection::Guard guard, const Batch& batch) noexc
 // What fails is answered as the refusal of the row behind those that are done.
 PgQuery::Batch PgQuery::RunReturning(RowSource& source, std::uint32_t first, std::uint32_t last, bool heeds, RowSink& sink) {
     Batch batch;
-    std::vector<Result> results(std::min(last - first, kMostRows));
+    std::vector<Returned> results(std::min(last - first, kMostRows));
     const PgConnection::Guard guard =
         SendReturning(source, first, first + static_cast<std::uint32_t>(results.size()), heeds, batch);
     if (batch.sent == 0) return batch;
     Status failure = ReadReturning(guard, heeds, batch, results);
+    batch.told = connection_.Server().Told();
     connection_.Note();    // that a transaction has begun
     std::uint32_t kept = connection_.Server().Broken() ? 0 : batch.done;
     Status ended = UndoRows(kept, batch, since_);
     for (std::uint32_t row = 0; row < kept && ended.Ok(); ++row) {
         const std::uint64_t before = connection_.Large().Now();
         ran_at_ = connection_.Large().StatementRuns();    // which may have changed the rows of those before
-        Status status = Deliver(results[row].get(), first + row, sink);
+        Status status = Deliver(results[row].rows.get(), first + row, sink);
         if (status.Ok()) {
-            batch.affected += AffectedBy(results[row].get());
+            batch.affected += AffectedBy(results[row].rows.get());
             continue;
         }
         failure = std::move(status);
         kept = row;
+        connection_.Server().Untell(results[row].told, batch.told);
         ended = UndoRows(kept, batch, before);
     }
     if (ended.Ok()) ended = kept == 0 ? failure : ReleaseRows(guard, batch);

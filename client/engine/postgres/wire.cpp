@@ -118,6 +118,21 @@ void Wire::OnNotice(void* self, const PGresult* result) noexcept {
     }
 }
 
+// Notices may have been taken meanwhile.
+void Wire::TellLast(std::size_t first, std::size_t last) noexcept {
+    last = std::min(last, Told());
+    if (first >= last) return;
+    const auto begin = notices->begin();
+    std::rotate(begin + static_cast<std::ptrdiff_t>(first), begin + static_cast<std::ptrdiff_t>(last), notices->end());
+}
+
+void Wire::Untell(std::size_t first, std::size_t last) noexcept {
+    last = std::min(last, Told());
+    if (first >= last) return;
+    TellLast(first, last);
+    notices->erase(notices->end() - static_cast<std::ptrdiff_t>(last - first), notices->end());
+}
+
 // ---- Sending
 
 // A command that cannot be sent ends the batch: what would come behind it is left out.

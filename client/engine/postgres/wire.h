@@ -113,6 +113,10 @@ public:
     };
 
     std::vector<Status>* notices = nullptr;    // takes what the server says besides
+    [[nodiscard]] std::size_t Told() const noexcept { return notices ? notices->size() : 0; }
+    // Those from `first` to before `last` are of what was undone: it is done again, and tells them again.
+    void Untell(std::size_t first, std::size_t last) noexcept;
+    void TellLast(std::size_t first, std::size_t last) noexcept;    // these go behind the others
 
 private:
     Wire() = default;

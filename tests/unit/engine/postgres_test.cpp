@@ -190,6 +190,22 @@ TEST_F(Postgres, Notices) {
     EXPECT_EQ(notices[0].Number(), 20000);
     EXPECT_EQ(notices[0].Detail(), "hello");
     EXPECT_FALSE(notices[0].Failed());
+    // Each row of an array tells once, in its place, however often those before the ones that fail or are refused run.
+    MustCommit("create table t(n integer check (n <> 5))",
+               "create function tells() returns trigger language plpgsql as 'begin raise notice ''%'', new.n; return new; end'",
+               "create trigger tells before insert on t for each row execute function tells()");
+    struct : engine::RowSink {
+        Status Row(std::uint32_t row, std::span<const Datum>) override { return row == 2 ? Error(1406) : Status(); }
+    } refuses;
+    Rows rows{{Integer(0)}};
+    for (int n = 1; n < 10; ++n) rows.rows.push_back({Integer(n)});
+    for (const char* const sql : {"insert into t values(%1)", "insert into t values(%1 + 0)", "insert into t values(%1) returning n"}) {
+        engine::ArrayOutcome outcome;
+        EXPECT_EQ(Answer(Prepared(sql, rows.rows[0])->ExecuteArray(rows, {0, 10, true, &refuses}, outcome)), 0);
+        std::string told;
+        for (const Status& notice : connection_->TakeNotices()) told += notice.Detail();
+        EXPECT_EQ(told, "0123456789") << sql;
+    }
 }
 
 // What is bound, in the binary form and in texts; what is a literal in a statement.
