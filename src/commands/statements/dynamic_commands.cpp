@@ -190,11 +190,22 @@ void DefineDynamic(const CommandRow& row, int count, char** words) {
 
 // --- Pieces by hand --------------------------------------------------------------------------------------------------
 
-// What the library last said about a piece. The handle is compared with, never used.
+// What the library last said about a piece. The handle is compared with, never used; one that lies where another was
+// has been registered since.
 struct {
     const void* handle = nullptr;
+    uint32_t turn = 0;
     ub1 direction = 0;
 } last_piece;
+
+uint32_t TurnOfBind(const void* handle) {
+    const NamedObject* const slot = FindNewestByPointer(Kind::bind, handle);
+    return slot == nullptr ? 0 : slot->turn;
+}
+
+bool ComesOut(const void* handle) {
+    return handle == last_piece.handle && TurnOfBind(handle) == last_piece.turn && last_piece.direction == OCI_PARAM_OUT;
+}
 
 struct PieceInfo {
     void* handle = nullptr;
@@ -247,7 +258,7 @@ void GetPieceInfo(const CommandRow& row, int count, char** words) {
                           asked.Place(info.iteration, kIteration), asked.Place(info.index, kIndex),
                           asked.Place(info.piece, kPiece));
     if (rc == OCI_SUCCESS) {
-        last_piece = {info.handle, info.direction};
+        last_piece = {info.handle, TurnOfBind(info.handle), info.direction};
         // Without its type, a handle is that of a define if one has it.
         if (!asked.Wants(kType) && FindByPointer(Kind::define, info.handle) != nullptr) info.type = OCI_HTYPE_DEFINE;
         PrintPieceInfo(info, asked);
@@ -281,9 +292,7 @@ void SetPieceInfo(const CommandRow& row, int count, char** words) {
     MemBuffer* const buffer = FindDynamicBuffer(words[5], count == 7 ? DecodeLong(words[6]) : 0);
     if (buffer == nullptr || !buffer->Complete() || !AttachLengths(*buffer)) return;
     const FirstLengths before(buffer->dynamic);
-    const bool comes_out =
-        type == OCI_HTYPE_DEFINE || (handle == last_piece.handle && last_piece.direction == OCI_PARAM_OUT);
-    uint32_t* const length = PieceLength(*buffer, comes_out);
+    uint32_t* const length = PieceLength(*buffer, type == OCI_HTYPE_DEFINE || ComesOut(handle));
     const sword rc = Call(&ClientLibrary::OCIStmtSetPieceInfo, handle, static_cast<ub4>(type), error,
                           DataFor(*buffer, 0), buffer->call_lengths == nullptr ? nullptr : length, piece,
                           IndicatorFor(*buffer, 0), ReturnCodeFor(*buffer, 0));
