@@ -7,6 +7,7 @@
 #include <span>
 
 #include "date/date.h"
+#include "engine/pieces.h"
 #include "sql/token_list.h"
 #include "values/rowid.h"
 
@@ -88,8 +89,7 @@ private:
         result_.placeholders.push_back(static_cast<std::uint32_t>(found - all.begin()));
         const bool has_indicator = IsIndicator(tokens_, index + 1);
         const std::size_t end = tokens_[index + has_indicator].End();
-        const bool runs_on = tokens_[index + 1].kind == TokenKind::number;    // ?5
-        Replace(token, end, dialect_.placeholder(result_.placeholders.size()) + (runs_on ? " " : ""));
+        Replace(token, end, dialect_.placeholder(result_.placeholders.size()));
         return index + 1 + has_indicator;
     }
 
@@ -437,18 +437,31 @@ private:
     const Token& Previous(std::size_t index) const { return index > 0 ? tokens_[index - 1] : tokens_.back(); }
 
     void Copy(std::size_t end) {
-        result_.sql.append(text_.substr(copied_, end - copied_));
+        const std::string_view part = text_.substr(copied_, end - copied_);
+        const bool behind_edit = !result_.edits.empty() && result_.edits.back().end == result_.sql.size();
+        if (behind_edit && KeepApart(part)) ++result_.edits.back().end;
+        result_.sql.append(part);
         copied_ = end;
+    }
+
+    // What the engine would read as one word with the text before it, as in :"a"from; answers whether a blank was put between.
+    bool KeepApart(std::string_view part) {
+        const bool joins = !result_.sql.empty() && !part.empty() && engine::IsWordCharacter(result_.sql.back()) &&
+                           engine::IsWordCharacter(part.front());
+        if (joins) result_.sql += ' ';
+        return joins;
     }
 
     void Replace(const Token& first, std::size_t source_end, std::string_view replacement) {
         Copy(first.begin);
         const std::size_t begin = result_.sql.size();
+        KeepApart(replacement);
         result_.sql.append(replacement);
         result_.edits.push_back({first.begin, source_end, begin, result_.sql.size()});
         copied_ = source_end;
     }
 
+    // At the end of a word it makes that longer.
     void Insert(std::size_t place, std::string_view inserted) {
         if (inserted.empty()) return;
         Copy(place);
