@@ -301,7 +301,7 @@ private:
             if (!IsWord(At(part), "select")) return false;
             const std::vector<Names::Item> items = names_.Items(part);
             const bool is_all = std::any_of(items.begin(), items.end(), [](const Names::Item& item) { return item.is_all; });
-            return !is_all && IsOfType(items[index].expression);
+            return !is_all && index < items.size() && IsOfType(items[index].expression);
         });
     }
 

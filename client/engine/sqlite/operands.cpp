@@ -183,7 +183,11 @@ bool Operands::IsColumn(Span span) const {
 }
 
 bool Operands::IsQuery(Span span) const {
-    return IsWord(At(span.first), "select") || IsWord(At(span.first), "with") || IsWord(At(span.first), "values");
+    if (IsOneOf(At(span.first), {"select", "values"})) return true;
+    if (!IsWord(At(span.first), "with")) return false;
+    std::size_t at = span.first + (IsWord(At(span.first + 1), "recursive") ? 3 : 2);    // behind the first name, but for a column "with"
+    if (At(at) == "(") at = Partner(at) + 1;
+    return IsWord(At(at), "as");
 }
 
 std::vector<Span> Operands::List(Span span) const {
@@ -214,8 +218,9 @@ std::vector<Span> Operands::Choices(Span span) const {
 }
 
 std::vector<Span> Operands::Arguments(std::size_t function) const {
+    if (!IsName(At(function))) return {};
     std::vector<Span> arguments = List({function + 1, Partner(function + 1) + 1});
-    if (IsOneOf(At(arguments[0].first), {"distinct", "all"})) ++arguments[0].first;
+    if (!arguments.empty() && IsOneOf(At(arguments[0].first), {"distinct", "all"})) ++arguments[0].first;
     return arguments;
 }
 

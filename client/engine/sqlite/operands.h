@@ -18,7 +18,9 @@ public:
         return index < pieces_.size() ? pieces_[index] : std::string_view();
     }
     // The parenthesis that belongs to the one at `index`; the end of the text for anything else.
-    [[nodiscard]] std::size_t Partner(std::size_t index) const { return partners_[index]; }
+    [[nodiscard]] std::size_t Partner(std::size_t index) const {
+        return index < pieces_.size() ? partners_[index] : pieces_.size();
+    }
 
     // The parenthesis that opens around a piece; the end of the text where there is none.
     [[nodiscard]] std::size_t Around(std::size_t index) const;
@@ -42,7 +44,7 @@ public:
     [[nodiscard]] std::vector<Span> List(Span span) const;
     // The values that a CASE, or a call like nvl, gives one of; none for anything else.
     [[nodiscard]] std::vector<Span> Choices(Span span) const;
-    // Of the call whose name stands at `function`, without DISTINCT.
+    // Of the call whose name stands at `function`, without DISTINCT; none where no call stands.
     [[nodiscard]] std::vector<Span> Arguments(std::size_t function) const;
     // Those of its arguments, or of the values of a CASE, one of which an expression is; none for anything else.
     [[nodiscard]] std::vector<Span> Answers(Span span) const;
