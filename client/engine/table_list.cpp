@@ -20,6 +20,10 @@ bool IsAnyOf(std::string_view piece, std::initializer_list<std::string_view> wor
     return std::any_of(words.begin(), words.end(), [&](std::string_view word) { return IsWord(piece, word); });
 }
 
+bool BeginsWindows(const PieceList& pieces, std::size_t at) {
+    return at + 2 < pieces.size() && IsWord(pieces[at], "window") && IsName(pieces[at + 1]) && IsWord(pieces[at + 2], "as");
+}
+
 std::size_t FindPiece(const PieceList& pieces, std::size_t from, std::initializer_list<std::string_view> words) {
     int depth = 0;
     for (std::size_t index = from; index < pieces.size(); ++index) {
@@ -43,7 +47,9 @@ std::optional<ListOfTable> ReadSelect(const PieceList& pieces) {
     if (goes_on() && IsWord(pieces[at], "as")) ++at;
     if (goes_on() && !is_clause() && IsName(pieces[at])) read.alias = pieces[at++];
     if (goes_on() && !is_clause()) return {};
-    if (FindPiece(pieces, at, {"union", "except", "intersect", "group", "having", "window"}) < pieces.size()) return {};
+    if (FindPiece(pieces, at, {"union", "except", "intersect", "group", "having"}) < pieces.size()) return {};
+    for (at = FindPiece(pieces, at, {"window"}); at < pieces.size(); at = FindPiece(pieces, at + 1, {"window"}))
+        if (BeginsWindows(pieces, at)) return {};
     return read;
 }
 

@@ -233,9 +233,8 @@ std::vector<Names::Item> Names::Items(std::size_t select) const {
     if (IsOneOf(At(begin), {"distinct", "all"})) ++begin;
     for (std::size_t at = begin; ; ++at) {
         if (At(at) == "(") at = operands_.Partner(at) + 1;
-        const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" ||
-                          IsOneOf(At(at), {"from", "where", "group", "having", "window", "union", "except",
-                                           "intersect", "order", "limit"});
+        const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" || BeginsWindows(pieces_, at) ||
+                          IsOneOf(At(at), {"from", "where", "group", "having", "union", "except", "intersect", "order", "limit"});
         if (!ends && At(at) != ",") continue;
         items.push_back(ReadItem({begin, at}));
         if (ends) break;
@@ -300,7 +299,8 @@ void Names::ReadTables() {
         if (IsWord(At(at), "into")) inserts = true;
         const bool from = IsWord(At(at), "from") && !IsWord(At(at - 1), "distinct");    // no comparison
         if (from) level.lists = true;
-        if (IsOneOf(At(at), {"where", "group", "having", "window", "order", "limit", "returning"})) level.lists = false;
+        if (IsOneOf(At(at), {"where", "group", "having", "order", "limit", "returning"}) || BeginsWindows(pieces_, at))
+            level.lists = false;
         if (from || IsOneOf(At(at), {"join", "into", "update"}) || (At(at) == "," && level.lists))
             ReadTable(IsWord(At(at + 1), "or") ? at + 3 : at + 1, level.scope, IsWord(At(at), "into"));
     }

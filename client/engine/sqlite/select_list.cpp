@@ -111,6 +111,7 @@ bool CutAlias(std::vector<std::string_view>& pieces) {
 SelectItem ReadItem(std::string_view text) {
     std::vector<std::string_view> pieces = Split(text);
     SelectItem item;
+    if (pieces.empty()) return item;
     item.has_alias = CutAlias(pieces);
     const std::size_t size = pieces.size();
     const bool is_name = size == 1 || (size <= 5 && pieces[1] == "." && pieces[size - 2] == ".");    // main.t.rowid
@@ -130,9 +131,10 @@ bool PassReturning(Pieces& pieces) {
     return false;
 }
 
-bool EndsList(std::string_view piece) {
-    constexpr std::array<std::string_view, 9> kClauses = {"from", "where", "union", "order", "limit", "group",
-                                                          "except", "intersect", "window"};
+// The piece before `rest`; "window" does before NAME AS.
+bool EndsList(std::string_view piece, Pieces rest) {
+    constexpr std::array<std::string_view, 8> kClauses = {"from", "where", "union", "order", "limit", "group", "except", "intersect"};
+    if (IsWord(piece, "window")) return IsName(rest.Next()) && IsWord(rest.Next(), "as");
     return piece.empty() || piece == ";" || piece == ")" ||
            std::any_of(kClauses.begin(), kClauses.end(),
                        [&](std::string_view clause) { return IsWord(piece, clause); });
@@ -178,7 +180,7 @@ std::vector<SelectItem> ReadSelectList(std::string_view sql) {
         const std::string_view piece = pieces.Next();
         if (depth == 0 && begin == end && (IsWord(piece, "distinct") || IsWord(piece, "all"))) {
             begin = pieces.At();
-        } else if (depth == 0 && (piece == "," || EndsList(piece))) {
+        } else if (depth == 0 && (piece == "," || EndsList(piece, pieces))) {
             items.push_back(ReadItem(sql.substr(begin, end - begin)));
             if (piece != ",") return items;
             begin = pieces.At();
