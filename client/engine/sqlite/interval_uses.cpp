@@ -107,8 +107,7 @@ private:
                     if (is_row || IsOneOf(function, {"in", "values", "using", "over"})) return InList(span, open);
                     span = {open, span.last + 1};
                 } else if (IsOneOf(function, {"min", "max"})) {
-                    span = {open - 1, span.last + 1};
-                    while (IsOneOf(At(span.last), {"over", "filter"})) span.last = operands_.Partner(span.last + 1) + 1;
+                    span = {open - 1, operands_.BehindWindow(span.last + 1)};
                 } else {
                     return IsWord(function, "count") || InList(span, open);
                 }

@@ -88,9 +88,17 @@ std::size_t Operands::OperandEnd(std::size_t first) const {
     ++at;
     while (At(at) == ".") at += 2;
     if (At(at) != "(") return at;
-    at = Partner(at) + 1;
-    while ((IsWord(At(at), "over") || IsWord(At(at), "filter")) && At(at + 1) == "(") at = Partner(at + 1) + 1;
-    return at;
+    return BehindWindow(Partner(at) + 1);
+}
+
+// over NAME, behind a call: "over" is a name elsewhere.
+bool Operands::NamesWindow(std::size_t index) const {
+    return IsName(At(index)) && !IsKeyword(At(index)) && IsWord(At(index - 1), "over") && At(index - 2) == ")";
+}
+
+std::size_t Operands::BehindWindow(std::size_t at) const {
+    while (IsOneOf(At(at), {"over", "filter"}) && At(at + 1) == "(") at = Partner(at + 1) + 1;
+    return NamesWindow(at + 1) ? at + 2 : at;
 }
 
 // Behind the END of the CASE at `first`; `first` itself when it has none.
@@ -127,6 +135,7 @@ Span Operands::From(std::size_t first) const {
 std::size_t Operands::OperandBegin(std::size_t last) const {
     std::size_t at = last - 1;
     if (IsWord(At(at), "end") && CaseBegin(last) < last) return CaseBegin(last);
+    if (NamesWindow(at)) return OperandBegin(at - 1);
     if (At(at) == ")") {
         at = Partner(at);
         if (IsOneOf(At(at - 1), {"over", "filter"})) return OperandBegin(at - 1);

@@ -30,6 +30,8 @@ public:
     [[nodiscard]] Span From(std::size_t first) const;
     [[nodiscard]] Span Before(std::size_t last) const;    // without its collations
     [[nodiscard]] std::size_t BehindCollations(std::size_t at) const;
+    // Behind the FILTER and OVER of a call that ends before `at`.
+    [[nodiscard]] std::size_t BehindWindow(std::size_t at) const;
     // One operand alone, with its signs.
     [[nodiscard]] Span OneFrom(std::size_t first) const { return {first, OperandEnd(first)}; }
     [[nodiscard]] Span OneBefore(std::size_t last) const;
@@ -55,6 +57,7 @@ public:
 
 private:
     [[nodiscard]] bool IsOperand(std::size_t index) const;
+    [[nodiscard]] bool NamesWindow(std::size_t index) const;
     [[nodiscard]] std::size_t CaseEnd(std::size_t first) const;
     [[nodiscard]] std::size_t CaseBegin(std::size_t last) const;
     [[nodiscard]] std::size_t OperandEnd(std::size_t first) const;

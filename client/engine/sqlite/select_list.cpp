@@ -79,8 +79,10 @@ bool IsArithmetic(const std::vector<std::string_view>& pieces) {
     return calculates;
 }
 
-// Takes "over (...)" and "filter (...)" off the end.
+// Takes "over NAME", "over (...)" and "filter (...)" off the end.
 void CutWindow(std::vector<std::string_view>& pieces) {
+    const std::size_t size = pieces.size();
+    if (size > 3 && IsName(pieces[size - 1]) && IsWord(pieces[size - 2], "over") && pieces[size - 3] == ")") pieces.resize(size - 2);
     int depth = 0;
     for (std::size_t index = pieces.size(); index-- > 1;) {
         if (pieces[index] == ")") ++depth;
