@@ -38,11 +38,11 @@ private:
     [[nodiscard]] std::string_view At(std::size_t index) const { return operands_.At(index); }
     [[nodiscard]] std::string_view Before(std::size_t index) const { return At(index - 1); }
 
-    // What stands before an operator. What is in a list or exists is a number.
+    // What stands before an operator.
     [[nodiscard]] Span Left(std::size_t at) const {
         Span span = operands_.OneBefore(at);
         if (span.Size() > 0 && IsWord(Before(span.first), "collate")) span = operands_.OneBefore(span.first - 1);
-        return IsOneOf(Before(span.first), {"in", "exists"}) ? Span{} : span;
+        return span;
     }
 
     bool AnyDate(const std::vector<Span>& spans) {

@@ -131,21 +131,23 @@ Span Operands::From(std::size_t first) const {
     return {first, end};
 }
 
-// Where the operand before `last` begins, without its signs; `last` itself when there is none.
+// Where the operand before `last` begins, without its signs; `last` itself when there is none, as behind IN and EXISTS, whose
+// conditions are numbers.
 std::size_t Operands::OperandBegin(std::size_t last) const {
     std::size_t at = last - 1;
     if (IsWord(At(at), "end") && CaseBegin(last) < last) return CaseBegin(last);
     if (NamesWindow(at)) return OperandBegin(at - 1);
+    bool is_named = true;
     if (At(at) == ")") {
         at = Partner(at);
         if (IsOneOf(At(at - 1), {"over", "filter"})) return OperandBegin(at - 1);
-        if (!IsName(At(at - 1)) || IsKeyword(At(at - 1))) return at;
-        --at;
+        is_named = IsName(At(at - 1)) && !IsKeyword(At(at - 1));
+        if (is_named) --at;
     } else if (!IsOperand(at)) {
         return last;
     }
-    while (At(at - 1) == ".") at -= 2;
-    return at;
+    while (is_named && At(at - 1) == ".") at -= 2;
+    return IsOneOf(At(at - 1), {"in", "exists"}) ? last : at;
 }
 
 std::size_t Operands::BehindCollations(std::size_t at) const {
