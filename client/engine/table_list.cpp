@@ -24,6 +24,11 @@ bool BeginsWindows(const PieceList& pieces, std::size_t at) {
     return at + 2 < pieces.size() && IsWord(pieces[at], "window") && IsName(pieces[at + 1]) && IsWord(pieces[at + 2], "as");
 }
 
+bool BeginsConflict(const PieceList& pieces, std::size_t at) {
+    return at + 2 < pieces.size() && IsWord(pieces[at], "on") && IsWord(pieces[at + 1], "conflict") &&
+           (pieces[at + 2] == "(" || IsWord(pieces[at + 2], "do"));
+}
+
 std::size_t FindPiece(const PieceList& pieces, std::size_t from, std::initializer_list<std::string_view> words) {
     int depth = 0;
     for (std::size_t index = from; index < pieces.size(); ++index) {

@@ -159,10 +159,9 @@ private:
     }
 
     void InsertQuery(std::size_t at, const Columns& targets) {
-        std::size_t end = FindWord(at, {"returning", "conflict"});
-        const bool has_conflict = Is(end, "conflict");
-        if (has_conflict) --end;    // ON
-        WrapQuery({at, end}, targets, has_conflict);
+        std::size_t end = FindWord(at, {"returning", "on"});
+        while (Is(end, "on") && !BeginsConflict(pieces_, end)) end = FindWord(end + 1, {"returning", "on"});    // a join's
+        WrapQuery({at, end}, targets, Is(end, "on"));
     }
 
     // A query becomes "with kelp_source(c1, ...) as (<query>) select kelp_store(c1, ...), ... from kelp_source". What

@@ -290,9 +290,9 @@ void Names::ReadTables() {
             open.back() = {enter(parent == scope ? parents_.size() : parent)};
         } else if (IsWord(At(at), "select") && inserts && outside && open.back().scope == 0) {
             open.back().scope = enter(parents_.size());
-        } else if (inserts && outside && (IsWord(At(at), "returning") || (IsWord(At(at - 1), "on") && IsWord(At(at), "conflict")))) {
+        } else if (inserts && outside && (IsWord(At(at), "returning") || BeginsConflict(pieces_, at))) {
             open.back().scope = 0;
-            if (IsWord(At(at), "conflict")) NoteExcluded();
+            if (IsWord(At(at), "on")) NoteExcluded();
         }
         Level& level = open.back();
         scopes_[at] = level.scope;
