@@ -147,10 +147,13 @@ Names::Found Names::ColumnOf(const Table& table, std::string_view name) {
         if (!ReadColumn(database_, table.table, name, column)) return {};
         return {true, &columns_.emplace_back(std::move(column))};
     }
+    const std::pair key(table.query, Lower(PlainName(name)));
+    if (const auto known = of_queries_.find(key); known != of_queries_.end()) return known->second;
     if (IsTooDeep(name)) return {};
     ++depth_;
-    const Found found = ColumnOfQuery(table, PlainName(name));
+    const Found found = ColumnOfQuery(table, key.second);
     --depth_;
+    if (status_.Ok()) of_queries_.emplace(key, found);
     return found;
 }
 

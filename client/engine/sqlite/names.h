@@ -7,8 +7,10 @@
 #include <cstddef>
 #include <cstdint>
 #include <deque>
+#include <map>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "engine/pieces.h"
@@ -51,7 +53,7 @@ public:
     bool HasColumnOf(std::size_t select, const std::string& qualifier, TypeTest is_meant);
 
 private:
-    static constexpr int kDeepest = 30;      // subqueries within each other
+    static constexpr int kDeepest = 200;     // subqueries within each other
     static constexpr int kMostLooks = 1000;  // subqueries that join each other twice and twice again
 
     // A table or subquery of the statement, where it is named.
@@ -118,6 +120,7 @@ private:
     std::vector<With> withs_;
     int depth_ = 0;                       // of subqueries looked into, and how many for one name
     int looks_ = 0;
+    std::map<std::pair<std::size_t, std::string>, Found> of_queries_;    // by where the query begins and the name in lower case
     std::deque<TableColumn> columns_;     // that were told of, and what calls answer
 };
 
