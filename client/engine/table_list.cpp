@@ -29,10 +29,14 @@ bool BeginsConflict(const PieceList& pieces, std::size_t at) {
            (pieces[at + 2] == "(" || IsWord(pieces[at + 2], "do"));
 }
 
+bool BeginsFrom(const PieceList& pieces, std::size_t at) {
+    return at < pieces.size() && IsWord(pieces[at], "from") && !(at > 0 && IsWord(pieces[at - 1], "distinct"));
+}
+
 std::size_t FindPiece(const PieceList& pieces, std::size_t from, std::initializer_list<std::string_view> words) {
     int depth = 0;
     for (std::size_t index = from; index < pieces.size(); ++index) {
-        if (depth == 0 && IsAnyOf(pieces[index], words)) return index;
+        if (depth == 0 && IsAnyOf(pieces[index], words) && (!IsWord(pieces[index], "from") || BeginsFrom(pieces, index))) return index;
         if (pieces[index] == "(") ++depth;
         if (pieces[index] == ")") --depth;
     }

@@ -35,6 +35,8 @@ bool IsAnyOf(std::string_view piece, std::initializer_list<std::string_view> wor
 bool BeginsWindows(const PieceList& pieces, std::size_t at);
 // Whether an insert's ON CONFLICT stands there: before DO or the columns. CONFLICT is a name anywhere else.
 bool BeginsConflict(const PieceList& pieces, std::size_t at);
+// Whether FROM stands there, and no IS DISTINCT FROM.
+bool BeginsFrom(const PieceList& pieces, std::size_t at);
 // The first of some words outside of parentheses; the end of the text when there is none.
 std::size_t FindPiece(const PieceList& pieces, std::size_t from, std::initializer_list<std::string_view> words);
 

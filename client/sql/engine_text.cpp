@@ -128,23 +128,27 @@ private:
         const Token& next = At(tokens_, index + 1);
         const Token& before = Previous(index);
         const bool is_query = next.Is("select") || next.Is("with") || next.Is("values");
-        const bool is_place = before.Is("from") || before.Is("join") || before.Is(",");
+        const bool is_place = IsFrom(index - 1) || before.Is("join") || before.Is(",");
         return !dialect_.subquery_alias.empty() && is_query && is_place && (open_.empty() ? in_from_ : open_.back().in_from);
     }
 
+    // No comparison, as IS DISTINCT FROM is.
+    bool IsFrom(std::size_t index) const { return At(tokens_, index).Is("from") && !Previous(index).Is("distinct"); }
+
     // From clauses begin and end with words.
-    void NoteClause(const Token& token) {
+    void NoteClause(std::size_t index) {
+        const Token& token = tokens_[index];
         constexpr std::string_view kOthers[] = {"select", "where", "group", "order", "having", "union", "intersect",
                                                 "minus", "except", "limit", "set", "values"};
         bool& in_from = open_.empty() ? in_from_ : open_.back().in_from;
-        if (token.Is("from")) in_from = true;
+        if (IsFrom(index)) in_from = true;
         else if (in_from && std::any_of(std::begin(kOthers), std::end(kOthers), [&](auto word) { return token.Is(word); }))
             in_from = false;
     }
 
     std::size_t VisitWord(std::size_t index) {
         const Token& token = tokens_[index];
-        NoteClause(token);
+        NoteClause(index);
         const Token& literal = At(tokens_, index + 1);
         if (token.Is("x") && dialect_.bytes_literal && literal.kind == TokenKind::literal && literal.begin == token.End()) {
             Replace(token, literal.End(), dialect_.bytes_literal(literal.text.substr(1, literal.text.size() - 2)));

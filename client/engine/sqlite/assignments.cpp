@@ -56,7 +56,7 @@ private:
             if (pieces_[index] == ")" && --depth < 0) return index;
             if (depth != 0) continue;
             const bool found = std::any_of(words.begin(), words.end(), [&](auto word) { return Is(index, word); });
-            if (found) return index;
+            if (found && (!Is(index, "from") || BeginsFrom(pieces_, index))) return index;
         }
         return pieces_.size();
     }

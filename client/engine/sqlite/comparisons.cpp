@@ -48,10 +48,11 @@ public:
             } else if (EndsCondition(piece)) {
                 level.compares = false;
                 if (IsWord(piece, "set")) level.sets = true;
-                else if (IsOneOf(piece, {"where", "from", "returning", "order", "limit", "on"})) level.sets = false;
+                else if (IsOneOf(piece, {"where", "returning", "order", "limit", "on"}) || BeginsFrom(pieces_, at)) level.sets = false;
                 else if (IsWord(piece, "between")) Between(at);
                 else if (IsWord(piece, "in") && At(at + 1) == "(") In(at);
                 else if (IsWord(piece, "case")) Case(at);
+                else if (IsWord(piece, "is")) Is(at);
             }
         }
         return status_.Ok() ? names_.Failure() : status_;
@@ -102,6 +103,13 @@ private:
     }
 
     void In(std::size_t at) { CompareEach(Subject(at), operands_.List({at + 1, operands_.Partner(at + 1) + 1})); }
+
+    // d is '01-JAN-24', d is not distinct from '01-JAN-24'
+    void Is(std::size_t at) {
+        std::size_t other = at + 1;
+        while (IsOneOf(At(other), {"not", "distinct", "from"})) ++other;
+        if (!IsWord(At(other), "null")) Compare(operands_.Before(at), operands_.From(other));
+    }
 
     void CompareEach(Span subject, const std::vector<Span>& others) {
         for (const Span other : others) Compare(subject, other);

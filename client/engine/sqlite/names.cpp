@@ -236,8 +236,8 @@ std::vector<Names::Item> Names::Items(std::size_t select) const {
     if (IsOneOf(At(begin), {"distinct", "all"})) ++begin;
     for (std::size_t at = begin; ; ++at) {
         if (At(at) == "(") at = operands_.Partner(at) + 1;
-        const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" || BeginsWindows(pieces_, at) ||
-                          IsOneOf(At(at), {"from", "where", "group", "having", "union", "except", "intersect", "order", "limit"});
+        const bool ends = At(at).empty() || At(at) == ")" || At(at) == ";" || BeginsFrom(pieces_, at) || BeginsWindows(pieces_, at) ||
+                          IsOneOf(At(at), {"where", "group", "having", "union", "except", "intersect", "order", "limit"});
         if (!ends && At(at) != ",") continue;
         items.push_back(ReadItem({begin, at}));
         if (ends) break;
@@ -300,7 +300,7 @@ void Names::ReadTables() {
         Level& level = open.back();
         scopes_[at] = level.scope;
         if (IsWord(At(at), "into")) inserts = true;
-        const bool from = IsWord(At(at), "from") && !IsWord(At(at - 1), "distinct");    // no comparison
+        const bool from = BeginsFrom(pieces_, at);
         if (from) level.lists = true;
         if (IsOneOf(At(at), {"where", "group", "having", "order", "limit", "returning"}) || BeginsWindows(pieces_, at))
             level.lists = false;

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <array>
+#include <utility>
 
 #include "engine/pieces.h"
 #include "engine/sqlite/functions.h"
@@ -133,10 +134,11 @@ bool PassReturning(Pieces& pieces) {
     return false;
 }
 
-// The piece before `rest`; "window" does before NAME AS.
-bool EndsList(std::string_view piece, Pieces rest) {
-    constexpr std::array<std::string_view, 8> kClauses = {"from", "where", "union", "order", "limit", "group", "except", "intersect"};
+// The piece between `before` and `rest`; "window" does before NAME AS, "from" but behind DISTINCT.
+bool EndsList(std::string_view piece, std::string_view before, Pieces rest) {
+    constexpr std::array<std::string_view, 7> kClauses = {"where", "union", "order", "limit", "group", "except", "intersect"};
     if (IsWord(piece, "window")) return IsName(rest.Next()) && IsWord(rest.Next(), "as");
+    if (IsWord(piece, "from")) return !IsWord(before, "distinct");
     return piece.empty() || piece == ";" || piece == ")" ||
            std::any_of(kClauses.begin(), kClauses.end(),
                        [&](std::string_view clause) { return IsWord(piece, clause); });
@@ -177,12 +179,13 @@ std::vector<SelectItem> ReadSelectList(std::string_view sql) {
     std::vector<SelectItem> items;
     std::size_t begin = pieces.At();
     int depth = 0;
+    std::string_view before, piece;
     for (;;) {
         const std::size_t end = pieces.At();
-        const std::string_view piece = pieces.Next();
+        before = std::exchange(piece, pieces.Next());
         if (depth == 0 && begin == end && (IsWord(piece, "distinct") || IsWord(piece, "all"))) {
             begin = pieces.At();
-        } else if (depth == 0 && (piece == "," || EndsList(piece, pieces))) {
+        } else if (depth == 0 && (piece == "," || EndsList(piece, before, pieces))) {
             items.push_back(ReadItem(sql.substr(begin, end - begin)));
             if (piece != ",") return items;
             begin = pieces.At();
