@@ -348,7 +348,7 @@ void Names::NoteWith(std::size_t open) {
 void Names::ReadTable(std::size_t at, std::size_t scope, bool is_target) {
     while (At(at) == "(" && !operands_.IsQuery({at + 1, pieces_.size()})) ++at;
     const bool is_query = At(at) == "(";
-    if (!is_query && (!IsName(At(at)) || IsKeyword(At(at)))) return;
+    if (!is_query && (!IsName(At(at)) || IsWord(At(at), "set"))) return;    // do update set
     Table& table = tables_.emplace_back();
     table.scope = scope;
     table.is_natural = IsNaturalJoin(at);
@@ -362,8 +362,9 @@ void Names::ReadTable(std::size_t at, std::size_t scope, bool is_target) {
         table.name = table.table.name;
         UseWith(table);
     }
-    if (IsWord(At(at), "as")) ++at;
-    if (IsName(At(at)) && !IsKeyword(At(at))) table.name = PlainName(At(at++));
+    const bool is_told = IsWord(At(at), "as");
+    if (is_told) ++at;
+    if (IsName(At(at)) && (is_told || !IsKeyword(At(at)))) table.name = PlainName(At(at++));
     if (IsWord(At(at), "using"))
         for (std::size_t name = at + 2; name < operands_.Partner(at + 1); name += 2) table.merged.push_back(At(name));
 }

@@ -38,6 +38,12 @@ bool IsKeyword(std::string_view piece) {
     return std::binary_search(std::begin(kKeywords), std::end(kKeywords), std::string_view(lower.data(), piece.size()));
 }
 
+bool MayBeName(std::string_view piece) {
+    return IsName(piece) &&
+           (!IsKeyword(piece) || IsOneOf(piece, {"asc", "cross", "desc", "do", "end", "full", "inner", "left", "match", "nulls", "offset",
+                                                 "outer", "over", "partition", "right", "window", "with"}));
+}
+
 bool IsComparison(std::string_view piece) {
     constexpr std::string_view kComparisons[] = {"=", "==", "<>", "!=", "<", ">", "<=", ">="};
     return Contains(kComparisons, piece);
@@ -67,13 +73,11 @@ std::size_t Operands::Around(std::size_t index) const {
     return pieces_.size();
 }
 
-// A word, literal, number or placeholder that is an operand, or begins one, by itself. Some keywords are names there.
+// A word, literal, number or placeholder that is an operand, or begins one, by itself.
 bool Operands::IsOperand(std::size_t index) const {
     const std::string_view piece = At(index);
     if (piece.empty() || IsWord(piece, "null")) return !piece.empty();
-    if (IsName(piece) && IsKeyword(piece))
-        return IsOneOf(piece, {"end", "left", "right", "full", "cross", "inner", "outer", "match", "offset", "window"});
-    if (IsName(piece)) return true;
+    if (IsName(piece)) return MayBeName(piece);
     return piece.back() == '\'' || IsNumber(piece) || ParameterOf(piece) != kNoParameter;
 }
 

@@ -67,8 +67,9 @@ private:
     std::vector<std::size_t> partners_;
 };
 
-// Words that no column or function is named by.
+// Words of clauses and conditions; in an expression some of them may be names all the same.
 bool IsKeyword(std::string_view piece);
+bool MayBeName(std::string_view piece);
 
 bool IsOneOf(std::string_view piece, std::initializer_list<std::string_view> words);    // in lower case
 

@@ -74,7 +74,7 @@ bool IsArithmetic(const std::vector<std::string_view>& pieces) {
         if (is_operator && index + 1 == pieces.size()) return false;    // t.*
         calculates |= is_operator;
         if (!is_operator && !IsNumber(piece) && ParameterOf(piece) == kNoParameter && !IsLiteral(piece) &&
-            (!IsName(piece) || IsKeyword(piece)))
+            !MayBeName(piece))
             return false;
     }
     return calculates;
