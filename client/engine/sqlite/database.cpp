@@ -65,7 +65,7 @@ const Dialect& SqliteDatabase::GetDialect() const {
         .functions = kMoments,
         .casts = kCasts,
         .counts_characters = kCountsCharacters,
-        .dual = "(select 'X' as dummy)",
+        .dual = kDual,
         .minus = "except",
         .truncate_table = "delete from",
         .cuts_for_update = true,

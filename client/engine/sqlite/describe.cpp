@@ -12,6 +12,7 @@
 #include "engine/sqlite/names.h"
 #include "engine/sqlite/select_list.h"
 #include "engine/sqlite/stored_number.h"
+#include "engine/sqlite/table_columns.h"
 #include "engine/sqlite/union_columns.h"
 #include "oci.h"
 
@@ -74,9 +75,8 @@ std::string AsWritten(std::string_view text) {
             cast = FindCast(piece, counts_characters);
             if (!cast) continue;
             begin = pieces.At() - piece.size();
-            open = pieces.At() + 1;
         } else if (piece == "(") {
-            ++depth;
+            if (++depth == 1) open = pieces.At();
         } else if (piece == "," && depth == 1 && comma == 0) {
             comma = pieces.At() - 1;
         } else if (piece == ")" && --depth == 0) {
@@ -100,21 +100,37 @@ std::string WithMoments(std::string name) {
     return name;
 }
 
-// Without the calls that were put around operands of || and around what is cast to integers.
-std::string WithoutCalls(std::string name) {
-    for (const std::string_view call : {"kelp_text(", "kelp_whole("}) {
-        for (std::size_t at; (at = name.find(call)) != std::string::npos;) {
-            Pieces pieces(std::string_view(name).substr(at + call.size()));
-            int depth = 1;
-            for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
-                if (piece == "(") ++depth;
-                if (piece == ")" && --depth == 0) break;
-            }
-            if (depth == 0) name.erase(at + call.size() + pieces.At() - 1, 1);
-            name.erase(at, call.size());
-        }
+std::string WithDual(std::string name) {
+    constexpr std::string_view kName = "dual", kAlias = " as dual";
+    for (std::size_t at; (at = name.find(kDual)) != std::string::npos;) {
+        const bool has_alias = std::string_view(name).substr(at + kDual.size()).starts_with(kAlias);
+        name.replace(at, kDual.size() + (has_alias ? kAlias.size() : 0), kName);
     }
     return name;
+}
+
+// Without the calls that were put around operands of || and around what is cast to integers.
+std::string WithoutCalls(std::string_view name) {
+    std::string shown;
+    std::size_t copied = 0;
+    std::vector<bool> calls;    // by open parenthesis: whether it is such a call's
+    bool is_call = false;
+    Pieces pieces(name);
+    for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
+        bool drops = piece == "kelp_text" || piece == "kelp_whole";
+        const bool opens = std::exchange(is_call, drops);
+        if (piece == "(") {
+            calls.push_back(opens);
+            drops = opens;
+        } else if (piece == ")" && !calls.empty()) {
+            drops = calls.back();
+            calls.pop_back();
+        }
+        if (!drops) continue;
+        shown.append(name.substr(copied, pieces.At() - piece.size() - copied));
+        copied = pieces.At();
+    }
+    return shown.append(name.substr(copied));
 }
 
 std::string WithPlaceholders(std::string_view name, std::span<const std::string> written) {
@@ -132,9 +148,9 @@ std::string WithPlaceholders(std::string_view name, std::span<const std::string>
 
 // Names that were not quoted are shown in upper case. A name that stands quoted in the statement was.
 std::string ShownName(std::string_view name, std::string_view sql, std::span<const std::string> written) {
-    if (sql.find('"' + std::string(name) + '"') != std::string_view::npos) return std::string(name);
-    std::string shown = name.find("kelp_") == std::string_view::npos ? std::string(name)
-                                                                     : WithMoments(AsWritten(WithoutCalls(std::string(name))));
+    if (sql.find(QuotedName(name)) != std::string_view::npos) return std::string(name);
+    std::string shown = WithDual(std::string(name));
+    if (shown.find("kelp_") != shown.npos) shown = WithMoments(AsWritten(WithoutCalls(shown)));
     if (shown.find('?') != shown.npos) shown = WithPlaceholders(shown, written);
     char quote = '\0';
     for (char& c : shown) {

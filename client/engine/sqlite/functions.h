@@ -46,6 +46,9 @@ inline constexpr Dialect::Spelling kMoments[] = {
     {"localtimestamp", "(kelp_localtimestamp())"},
 };
 
+// The table of one row, in a from clause.
+inline constexpr std::string_view kDual = "(select 'X' as dummy)";
+
 Status AddFunctions(sqlite3* database);
 
 // What a call of a function answers, SQLite's own among them: the declared type, or the argument, from 1, whose type it
