@@ -45,6 +45,8 @@ public:
                 if (level.compares) return Error(errors::kNotProperlyEnded, "a comparison of a comparison");
                 level.compares = true;
                 Compare(operands_.Before(at), operands_.From(at + 1));
+            } else if (IsWord(piece, "nullif") && At(at + 1) == "(") {
+                if (const std::vector<Span> values = operands_.Arguments(at); values.size() == 2) Compare(values[0], values[1]);
             } else if (EndsCondition(piece)) {
                 level.compares = false;
                 if (IsWord(piece, "set")) level.sets = true;
