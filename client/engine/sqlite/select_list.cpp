@@ -60,11 +60,11 @@ std::string CastType(const std::vector<std::string_view>& pieces) {
 }
 
 // Whether the pieces are numbers, calls, names and the like with nothing but arithmetic between them. Comparisons and
-// || are none, nor is what may be a name behind an operand.
+// || are none, nor is what may be a name behind an operand; a plus before one does nothing to it.
 bool IsArithmetic(const std::vector<std::string_view>& pieces) {
     const std::size_t first = pieces[0] == "-" || pieces[0] == "+" ? 1 : 0;
     int depth = 0;
-    bool calculates = first == 1;
+    bool calculates = pieces[0] == "-";
     for (std::size_t index = first; index < pieces.size(); ++index) {
         const std::string_view piece = pieces[index];
         if (piece == "(") ++depth;
@@ -154,6 +154,10 @@ ExpressionType ReadType(std::vector<std::string_view> pieces) {
         if (pieces.empty()) return {};
         if (pieces.size() == 1 && IsNumber(pieces[0])) return {"number", {}};
         if (IsArithmetic(pieces)) return {"number", {}};
+        if (pieces[0] == "+") {
+            pieces.erase(pieces.begin());
+            continue;
+        }
         if (std::string type = CastType(pieces); !type.empty()) return {std::move(type), {}};
         if (IsName(pieces[0]) && pieces.size() % 2 == 1 && (pieces.size() == 1 || pieces[1] == ".")) {
             return {{}, std::move(pieces)};
