@@ -317,7 +317,7 @@ private:
         if (Is(span.first, "null")) return true;
         return std::all_of(piece.begin(), piece.end(), [](unsigned char c) { return std::isdigit(c); }) &&
                std::ssize(piece) <= kExactDigits && target.column.type == SQLT_NUM &&
-               (target.column.precision == 0 || target.column.precision == 38);
+               (target.column.precision == 0 || (target.column.precision == 38 && target.column.scale == 0));
     }
 
     sqlite3* database_;
