@@ -14,6 +14,8 @@
 #include "engine/sqlite/operands.h"
 #include "engine/sqlite/table_columns.h"
 #include "handles/errors.h"
+#include "number/number.h"
+#include "oci.h"
 
 namespace engine::sqlite {
 namespace {
@@ -95,15 +97,30 @@ private:
         if (type_end == type) return {};
         Column column;
         if (!ReadDeclaredType(sql_.substr(Begin(type), End(type_end - 1) - Begin(type)), column)) return {};
-        if (!Coercion::Concerns(column)) return {};
+        const bool as_text = is_number && IsTextType(column.type);
+        if (!as_text && !Coercion::Concerns(column)) return {};
         column.name = UpperCase(PlainName(pieces_[definition.first]));
         if (is_number && IsDateType(column.type)) return Error(errors::kInconsistentTypes, "column " + column.name);
-        const std::string written = is_number ? std::string(sql_.substr(Begin(at + 1), End(literal) - Begin(at + 1)))
-                                              : PlainText(pieces_[literal]);
+        std::string written = is_number ? std::string(sql_.substr(Begin(at + 1), End(literal) - Begin(at + 1)))
+                                        : PlainText(pieces_[literal]);
+        Status status = as_text ? ShowNumber(written) : Status();
         std::string kept;
-        if (Status status = Convert(written, column, Coercion::Purpose::store, kept); !status.Ok()) return status;
+        if (status.Ok()) status = Convert(written, column, Coercion::Purpose::store, kept);
+        if (!status.Ok()) return status;
         targets_.edits.push_back({Begin(at + 1), End(literal), std::move(kept), "", true});
         return {};
+    }
+
+    // The literal of a number as the number comes out.
+    static Status ShowNumber(std::string& text) {
+        OCINumber number;
+        std::size_t length = 0;
+        const auto digits = std::remove_if(text.begin(), text.end(), [](unsigned char c) { return std::isspace(c); });
+        int failure = number::FromPlainText({text.begin(), digits}, '.', &number);
+        text.resize(number::kMaxPlainText);
+        if (failure == 0) failure = number::ToPlainText(number, '.', text.data(), &length);
+        text.resize(length);
+        return failure == 0 ? Status() : Error(failure);
     }
 
     void Insert(std::size_t verb) {
