@@ -107,7 +107,7 @@ Coercion::Coercion(Column column, Purpose purpose, Origin origin)
 }
 
 bool Coercion::ConcernsComparison(const Column& column) {
-    return IsDateType(column.type) || IsIntervalType(column.type) || IsNumberType(column.type) || column.type == SQLT_AFC || column.type == SQLT_BIN;
+    return IsDateType(column.type) || IsIntervalType(column.type) || IsNumeric(column.type) || column.type == SQLT_AFC || column.type == SQLT_BIN;
 }
 
 bool Coercion::Concerns(const Column& column) {
@@ -200,16 +200,17 @@ void Coercion::KeepAmongReals(Datum& value) {
     Set(value, Kind::bytes, text_.data(), text_.size());
 }
 
-// A real of the column's width, whatever came as a number.
+// A real of the column's width, whatever came as a number. An integer is compared with reals as it is.
 Status Coercion::ApplyBinary(Datum& value) {
     if (Status status = ApplyNumber(value); status.Failed() || value.kind == Kind::null) return status;
     if (value.kind == Kind::integer) {
+        if (purpose_ == Purpose::compare) return {};
         value.real = static_cast<double>(value.integer);
     } else if (value.kind == Kind::decimal) {
         (void)number::ToDouble(*static_cast<const OCINumber*>(value.data), &value.real);    // which holds more
     }
     value.kind = Kind::real;
-    if (column_.type == SQLT_IBDOUBLE) return {};
+    if (column_.type == SQLT_IBDOUBLE || purpose_ == Purpose::compare) return {};
     const auto narrow = static_cast<float>(value.real);
     if (std::isinf(narrow) && !std::isinf(value.real)) return Refuse(errors::kNumericOverflow);
     value.real = number::WidenByDigits(narrow);
