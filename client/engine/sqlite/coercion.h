@@ -1,6 +1,5 @@
 // What a column's declaration makes of a value that is stored into it: numbers from text, rounded to the scale; dates
-// from text; texts and bytes that must fit. SQLite itself stores anything anywhere. An object serves one statement, on
-// one thread at a time.
+// from text; texts and bytes that must fit. SQLite itself stores anything anywhere. An object serves one thread at a time.
 #pragma once
 
 #include <string>

@@ -3,9 +3,10 @@
 
 #include <algorithm>
 #include <array>
-#include <memory>
+#include <map>
 #include <new>
 #include <string>
+#include <utility>
 
 #include "date/date.h"
 #include "date/zone.h"
@@ -186,27 +187,39 @@ void Nvl2(sqlite3_context* context, int, Arguments arguments) {
     sqlite3_result_value(context, arguments[null ? 2 : 1]);
 }
 
+// A row with what a connection's calls have read of declared types, by the type's and the column's words. SQLite would
+// look through what it keeps for all the calls of a statement.
+struct CoercingRow : FunctionRow {
+    struct Before {
+        using is_transparent = void;
+        using Words = std::pair<std::string_view, std::string_view>;
+        bool operator()(const Words& left, const Words& right) const { return left < right; }
+    };
+    std::map<std::pair<std::string, std::string>, Coercion, Before> known;
+};
+
 // store(x, 'declared type', 'column'): what a column of that type takes, or refuses; compare(x, ...): what x is when it
-// is compared with one. The type is read once a statement.
+// is compared with one.
 template <Coercion::Purpose purpose>
 void Coerce(sqlite3_context* context, int, Arguments arguments) {
-    auto* coercion = static_cast<Coercion*>(sqlite3_get_auxdata(context, 1));
-    std::unique_ptr<Coercion> made;
-    if (!coercion) {
+    constexpr std::size_t kMostKnown = 1000;
+    auto& known = static_cast<CoercingRow*>(static_cast<FunctionRow*>(sqlite3_user_data(context)))->known;
+    const std::string_view declared = TextOf(arguments[1]);
+    const std::string_view name = TextOf(arguments[2]);
+    auto found = known.find(std::pair(declared, name));
+    if (found == known.end()) {
         Column column;
-        if (!ReadDeclaredType(TextOf(arguments[1]), column)) return sqlite3_result_value(context, arguments[0]);
-        column.name = TextOf(arguments[2]);
-        made = std::make_unique<Coercion>(std::move(column), purpose, Coercion::Origin::computed);
-        coercion = made.get();
+        if (!ReadDeclaredType(declared, column)) return sqlite3_result_value(context, arguments[0]);
+        column.name = name;
+        if (known.size() >= kMostKnown) known.clear();
+        Coercion coercion(std::move(column), purpose, Coercion::Origin::computed);
+        found = known.emplace(std::pair(std::string(declared), std::string(name)), std::move(coercion)).first;
     }
     OCINumber number;
     Datum value = ReadDatum(arguments[0], number);
-    const Status status = coercion->Apply(value);
+    const Status status = found->second.Apply(value);
     if (status.Failed()) Refuse(context, status);
     else ReturnDatum(context, value);
-    if (made) {
-        sqlite3_set_auxdata(context, 1, made.release(), [](void* kept) { delete static_cast<Coercion*>(kept); });
-    }
 }
 
 // Large objects without anything in them are no nulls.
@@ -234,13 +247,17 @@ constexpr FunctionRow kFunctionRows[] = {
     {"kelp_span_ym", 2, 2, SQLITE_DETERMINISTIC, ToInterval<SQLT_INTERVAL_YM>},
     {"kelp_span_ds", 3, 3, SQLITE_DETERMINISTIC, ToInterval<SQLT_INTERVAL_DS>},
     {"kelp_interval_text", 2, 2, SQLITE_DETERMINISTIC, ToIntervalText},
-    {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::store>},
-    {"kelp_compare", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::compare>},
     {"nvl", 2, 2, SQLITE_DETERMINISTIC, Nvl, "", 1},
     {"nvl2", 3, 3, SQLITE_DETERMINISTIC, Nvl2, "", 2},
     {"kelp_sysdate", 0, 0, 0, Now<Moment::date>, "date"},
     {"kelp_localtimestamp", 0, 0, 0, Now<Moment::local>, "timestamp"},
     {"kelp_systimestamp", 0, 0, 0, Now<Moment::zoned>, "timestamp_tz"},
+};
+
+// Each connection has its own.
+constexpr FunctionRow kCoercingRows[] = {
+    {"kelp_store", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::store>},
+    {"kelp_compare", 3, 3, SQLITE_DETERMINISTIC, Coerce<Coercion::Purpose::compare>},
 };
 
 // What SQLite's own functions answer.
@@ -278,9 +295,18 @@ Status AddFunction(sqlite3* database, const FunctionRow& row) {
     return {};
 }
 
+Status AddCoercing(sqlite3* database, const FunctionRow& row) {
+    FunctionRow* const kept = new CoercingRow{row, {}};
+    const auto end = [](void* ended) { delete static_cast<CoercingRow*>(static_cast<FunctionRow*>(ended)); };
+    const int code = sqlite3_create_function_v2(database, row.name, row.least, SQLITE_UTF8 | row.flags, kept, Call, nullptr, nullptr, end);
+    return code == SQLITE_OK ? Status() : Failure(database, code);    // where it has ended, too
+}
+
 }  // namespace
 
 Status AddFunctions(sqlite3* database) {
+    for (const FunctionRow& row : kCoercingRows)
+        if (Status status = AddCoercing(database, row); status.Failed()) return status;
     for (const auto& table : Tables()) {
         for (const FunctionRow& row : table) {
             if (Status status = AddFunction(database, row); status.Failed()) return status;

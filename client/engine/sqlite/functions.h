@@ -1,6 +1,6 @@
 // The SQL functions that this engine adds: casts that SQLite would do another way, the time with its zone, and those of
 // the dialect. SQLite calls them on the thread that steps a statement; they keep nothing between calls but what belongs
-// to the statement, and throw nothing into it.
+// to the connection, and throw nothing into it.
 #pragma once
 
 #include <sqlite3.h>
