@@ -4,7 +4,6 @@
 #include <algorithm>
 #include <cctype>
 #include <deque>
-#include <functional>
 #include <initializer_list>
 #include <string>
 #include <utility>
@@ -181,17 +180,20 @@ private:
         WrapQuery({at, end}, targets, Is(end, "on"));
     }
 
+    // How the values of a query's column become texts; of several queries the greatest counts.
+    enum class Shown : std::uint8_t { as_they_are, with_all_digits, as_computed };
+
     // A query becomes "with kelp_source(c1, ...) as (<query>) select kelp_store(c1, ...), ... from kelp_source". What
     // ON CONFLICT follows needs a condition before it.
     void WrapQuery(Span query, const Columns& targets, bool with_condition) {
-        const std::vector<bool> texts = AssignQuery(query, targets);
+        const std::vector<Shown> shown = AssignQuery(query, targets);
         bool concerned = false;
         std::string names;
         std::string values;
         for (std::size_t index = 0; index < targets.size(); ++index) {
             const std::string name = "c" + std::to_string(index + 1);
             const std::string_view separator = index > 0 ? ", " : "";
-            const std::string stored = Stored(name, targets[index], texts[index]);
+            const std::string stored = Stored(name, targets[index], shown[index]);
             concerned |= stored != name;
             names.append(separator).append(name);
             values.append(separator).append(stored);
@@ -201,43 +203,71 @@ private:
                                   "\n) select " + values + " from kelp_source" + (with_condition ? " where 1 " : " ")});
     }
 
-    // The placeholders of a query, or of several with UNION ALL between them: others compare theirs. Answers which of the
-    // columns have texts then, where SQLite itself would make texts.
-    std::vector<bool> AssignQuery(Span query, const Columns& targets) {
+    // What a query, or several with UNION and its like between them, gives to columns of texts. Beside what is computed
+    // placeholders become texts at once, where that changes neither the order nor which rows are alike.
+    std::vector<Shown> AssignQuery(Span query, const Columns& targets) {
+        std::vector<Shown> shown(targets.size(), Shown::as_they_are);
+        if (std::none_of(targets.begin(), targets.end(), TakesText)) return shown;
         const std::vector<std::size_t> parts = names_.Parts(query.first);
-        const bool takes_all = std::all_of(parts.begin(), parts.end(), [&](std::size_t part) { return part == parts[0] || Is(part - 1, "all"); });
-        const bool makes_texts = std::any_of(targets.begin(), targets.end(), MakesText);
-        std::vector<bool> texts(targets.size(), true);
+        const bool looks = parts.size() > 1 || std::any_of(targets.begin(), targets.end(), MakesText);
         for (const std::size_t part : parts) {
-            std::vector<bool> of_part = makes_texts ? names_.Texts(part, targets.size()) : texts;
-            if (takes_all && Is(part, "select")) AssignItems(part, query.last, targets, of_part);
-            std::transform(texts.begin(), texts.end(), of_part.begin(), texts.begin(), std::logical_and<>());
+            const std::vector<Shown> of_part = ShownBy(part, targets, looks);
+            std::transform(shown.begin(), shown.end(), of_part.begin(), shown.begin(), [](Shown a, Shown b) { return std::max(a, b); });
         }
-        return texts;
+        const bool takes_all = std::all_of(parts.begin(), parts.end(), [&](std::size_t part) { return part == parts[0] || Is(part - 1, "all"); });
+        const bool at_once = takes_all && FindWord(query.first, {"order", "limit"}) >= query.last;
+        for (const std::size_t part : parts) AssignItems(part, targets, shown, at_once);
+        return shown;
     }
 
-    // A placeholder's value becomes a text before it is a number to SQLite; it is measured when a row comes.
-    void AssignItems(std::size_t select, std::size_t last, const Columns& targets, std::vector<bool>& texts) {
-        std::size_t at = select + (Is(select + 1, "distinct") || Is(select + 1, "all") ? 2 : 1);
-        for (std::size_t column = 0; column < targets.size(); ++column) {
-            const std::size_t end = std::min(FindWord(at, {",", "from", "where", "group", "having", "order", "limit", "union"}), last);
-            const bool has_alias = end - at > 2 && Is(end - 2, "as");
-            const Span value = Bare({at, has_alias ? end - 2 : end});
+    // The items of a query's list, when there is one a column.
+    std::vector<Names::Item> ItemsFor(std::size_t part, const Columns& targets) const {
+        std::vector<Names::Item> items = Is(part, "select") ? names_.Items(part) : std::vector<Names::Item>();
+        const bool alike = items.size() == targets.size() && std::none_of(items.begin(), items.end(), [](const auto& item) { return item.is_all; });
+        return alike ? items : std::vector<Names::Item>();
+    }
+
+    std::vector<Shown> ShownBy(std::size_t part, const Columns& targets, bool looks) {
+        const std::vector<Names::Item> items = ItemsFor(part, targets);
+        std::vector<std::uint16_t> types(targets.size());
+        if (looks || items.empty()) types = names_.Types(part, targets.size());
+        std::vector<Shown> shown(targets.size(), Shown::as_computed);
+        for (std::size_t index = 0; index < targets.size(); ++index) {
+            const std::uint16_t type = types[index];
+            if (IsTextType(type) || IsDateType(type) || IsIntervalType(type)) shown[index] = Shown::as_they_are;
+            else if (type == SQLT_IBDOUBLE) shown[index] = Shown::with_all_digits;
+            else if (!items.empty() && TakesText(targets[index])) shown[index] = ShownItem(items[index].expression);
+        }
+        return shown;
+    }
+
+    Shown ShownItem(Span item) {
+        const Span value = Bare(item);
+        const std::string_view piece = pieces_[value.first];
+        if (value.Size() == 1 && (IsLiteral(piece) || IsWord(piece, "null"))) return Shown::as_they_are;
+        const bool is_short = value.Size() == 1 && IsNumber(piece) && std::ssize(piece) <= kExactDigits;
+        const bool is_placeholder = value.Size() == 1 && ParameterOf(piece) != kNoParameter;
+        return is_short || is_placeholder || names_.HasAllDigits(value) ? Shown::with_all_digits : Shown::as_computed;
+    }
+
+    void AssignItems(std::size_t part, const Columns& targets, const std::vector<Shown>& shown, bool at_once) {
+        const std::vector<Names::Item> items = ItemsFor(part, targets);
+        for (std::size_t column = 0; column < items.size(); ++column) {
+            const Span value = Bare(items[column].expression);
             const std::size_t index = value.Size() == 1 ? ParameterOf(pieces_[value.first]) : kNoParameter;
-            if (targets[column] && index != kNoParameter && IsText(*targets[column])) {
-                Column text = targets[column]->column;
-                text.size = text.characters = 0;
-                targets_.parameters.push_back({index, std::move(text), Coercion::Purpose::store});
-                texts[column] = true;
-            }
-            if (!Is(end, ",")) return;
-            at = end + 1;
+            if (index == kNoParameter || !TakesText(targets[column])) continue;
+            Column text = targets[column]->column;
+            text.size = text.characters = 0;
+            const bool becomes_text = at_once && shown[column] == Shown::as_computed;
+            targets_.parameters.push_back({index, std::move(text), becomes_text ? Coercion::Purpose::store : Coercion::Purpose::pass});
         }
     }
 
-    static std::string Stored(const std::string& expression, const TableColumn* target, bool is_text) {
+    static std::string Stored(std::string expression, const TableColumn* target, Shown shown) {
+        const bool with_all_digits = TakesText(target) && shown == Shown::with_all_digits;
+        if (with_all_digits) expression = "kelp_exact_text(" + expression + ")";
         if (target && target->concerned) return "kelp_store(" + expression + Described(*target);
-        return MakesText(target) && !is_text ? "kelp_text(" + expression + ")" : expression;
+        return MakesText(target) && shown == Shown::as_computed ? "kelp_text(" + expression + ")" : expression;
     }
     static std::string Described(const TableColumn& target) {
         return ", " + Literal(target.declared) + ", " + Literal(target.column.name) + ")";
@@ -300,10 +330,14 @@ private:
         return ReadDeclaredType(target.declared, column) && IsTextType(column.type);
     }
 
-    static bool MakesText(const TableColumn* target) { return target && !target->concerned && IsText(*target); }
+    static bool TakesText(const TableColumn* target) { return target && IsText(*target); }
+    static bool MakesText(const TableColumn* target) { return TakesText(target) && !target->concerned; }
 
     void NoteText(Span span, const TableColumn& target) {
-        if (!MakesText(&target)) return;
+        if (!MakesText(&target)) {
+            if (IsText(target) && names_.HasAllDigits(span)) targets_.texts.push_back(span);
+            return;
+        }
         const std::string number = LongNumber(span, target);
         if (number.empty()) targets_.texts.push_back(span);
         else targets_.edits.push_back({Begin(span.first), End(span.last - 1), "kelp_text(" + number, ")", true});

@@ -125,6 +125,7 @@ bool Coercion::Concerns(const Column& column) {
 
 Status Coercion::Apply(Datum& value) {
     if (value.kind == Kind::null) return {};
+    if (purpose_ == Purpose::pass) return value.kind == Kind::row_id ? Refuse(errors::kInconsistentTypes) : Status();
     if (column_.type == SQLT_IBFLOAT || column_.type == SQLT_IBDOUBLE) return ApplyBinary(value);
     if (IsNumberType(column_.type)) {
         Status status = ApplyNumber(value);

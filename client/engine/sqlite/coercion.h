@@ -13,8 +13,9 @@ namespace engine::sqlite {
 
 class Coercion {
 public:
-    // A value that is compared with a column is read as the column's type, but neither rounded nor measured.
-    enum class Purpose : std::uint8_t { store, compare };
+    // A value that is compared with a column is read as the column's type, but neither rounded nor measured. One that
+    // passes a query on its way into a column stays as it is, and must not be a row id.
+    enum class Purpose : std::uint8_t { store, compare, pass };
 
     // Of a real that is bound every digit counts, of one that the engine computed as many as of a number.
     enum class Origin : std::uint8_t { bound, computed };

@@ -109,7 +109,7 @@ std::string WithDual(std::string name) {
     return name;
 }
 
-// Without the calls that were put around operands of || and around what is cast to integers.
+// Without the calls that were put around operands of || and around what is cast.
 std::string WithoutCalls(std::string_view name) {
     std::string shown;
     std::size_t copied = 0;
@@ -117,7 +117,7 @@ std::string WithoutCalls(std::string_view name) {
     bool is_call = false;
     Pieces pieces(name);
     for (std::string_view piece = pieces.Next(); !piece.empty(); piece = pieces.Next()) {
-        bool drops = piece == "kelp_text" || piece == "kelp_whole";
+        bool drops = IsOneOf(piece, {"kelp_text", "kelp_exact_text", "kelp_whole", "kelp_real"});
         const bool opens = std::exchange(is_call, drops);
         if (piece == "(") {
             calls.push_back(opens);

@@ -54,19 +54,23 @@ void ToNumber(sqlite3_context* context, int count, Arguments arguments) {
     ReturnStored(context, std::move(column), arguments[0]);
 }
 
-// whole(x): what a cast to an integer, of 64 bits, then takes as it is
-void ToWhole(sqlite3_context* context, int, Arguments arguments) {
+// whole(x): what a cast to an integer, of 64 bits, then takes as it is; real(x): what one to another type of numbers does
+template <bool whole>
+void ToPlain(sqlite3_context* context, int, Arguments arguments) {
     if (sqlite3_value_type(arguments[0]) == SQLITE_INTEGER) return sqlite3_result_value(context, arguments[0]);
     Column column;
-    ReadDeclaredType("integer", column);
+    ReadDeclaredType(whole ? "integer" : "number", column);
     OCINumber number;
     Datum value = ReadDatum(arguments[0], number);
     Coercion coercion(std::move(column));
     const Status status = coercion.Apply(value);
     if (status.Failed()) return Refuse(context, status);
     const bool fits = value.kind != Kind::decimal || StoredNumber::From(value.Number()).form == StoredNumber::Form::integer;
-    if (!fits) return Refuse(context, errors::kNumericOverflow);
-    ReturnDatum(context, value);
+    if (fits) return ReturnDatum(context, value);
+    if (whole) return Refuse(context, errors::kNumericOverflow);
+    double real = 0;
+    (void)number::ToDouble(value.Number(), &real);    // which holds more
+    sqlite3_result_double(context, real);
 }
 
 // text(x): a number as it is shown, anything else as it is
@@ -76,6 +80,13 @@ void ToShownText(sqlite3_context* context, int, Arguments arguments) {
     const TextArgument shown(arguments[0]);
     if (shown.Failure() != 0) return Refuse(context, shown.Failure());
     sqlite3_result_text64(context, shown.Text().data(), shown.Text().size(), SQLITE_TRANSIENT, SQLITE_UTF8);
+}
+
+// exact_text(x): what a column of texts takes of a value whose digits all count
+void ToExactText(sqlite3_context* context, int, Arguments arguments) {
+    Column column;
+    ReadDeclaredType("varchar2", column);
+    ReturnStored(context, std::move(column), arguments[0]);
 }
 
 // decfloat(x), decfloat(x, digits): rounded to 34 or 16 digits
@@ -230,8 +241,10 @@ constexpr FunctionRow kFunctionRows[] = {
     {"empty_clob", 0, 0, SQLITE_DETERMINISTIC, EmptyClob, "clob"},
     {"empty_blob", 0, 0, SQLITE_DETERMINISTIC, EmptyBlob, "blob"},
     {"kelp_number", 1, 3, SQLITE_DETERMINISTIC, ToNumber},
-    {"kelp_whole", 1, 1, SQLITE_DETERMINISTIC, ToWhole},
+    {"kelp_whole", 1, 1, SQLITE_DETERMINISTIC, ToPlain<true>},
+    {"kelp_real", 1, 1, SQLITE_DETERMINISTIC, ToPlain<false>},
     {"kelp_text", 1, 1, SQLITE_DETERMINISTIC, ToShownText},
+    {"kelp_exact_text", 1, 1, SQLITE_DETERMINISTIC, ToExactText},
     {"kelp_decfloat", 1, 2, SQLITE_DETERMINISTIC, ToDecimalFloat},
     {"kelp_binary_float", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBFLOAT>},
     {"kelp_binary_double", 1, 1, SQLITE_DETERMINISTIC, ToBinary<SQLT_IBDOUBLE>},
@@ -325,6 +338,11 @@ ResultType FunctionResult(std::string_view name) {
         if (IsWord(name, row.name)) return row.result;
     }
     return {TakesNumbers(name) ? "number" : ""};
+}
+
+bool TakesTexts(std::string_view function) {
+    return IsOneOf(function, {"to_char", "substr", "replace", "lpad", "rpad", "instr", "initcap", "kelp_varchar", "kelp_varchar_chars",
+                              "kelp_nvarchar", "kelp_char", "kelp_char_chars", "kelp_nchar"});
 }
 
 bool TakesNumbers(std::string_view function) {

@@ -58,6 +58,8 @@ struct ResultType {
     int like = 0;
 };
 ResultType FunctionResult(std::string_view name);
+// One of the engine's that takes texts, and numbers as they are shown.
+bool TakesTexts(std::string_view function);
 // One of SQLite's own that calculates with numbers, and answers one.
 bool TakesNumbers(std::string_view function);
 

@@ -7,6 +7,7 @@
 #include "engine/sqlite/column_types.h"
 #include "engine/sqlite/select_list.h"
 #include "handles/errors.h"
+#include "oci.h"
 
 namespace engine::sqlite {
 namespace {
@@ -48,6 +49,17 @@ const TableColumn* Names::AnswerOf(Span span) {
     return &columns_.emplace_back(std::move(answered));
 }
 
+bool Names::HasAllDigits(Span span) {
+    span = operands_.Bare(span);
+    if (span.Size() == 0 || operands_.IsValue(span)) return false;
+    if (operands_.IsQuery(span)) {
+        const std::vector<std::size_t> parts = Parts(span.first);
+        return parts.size() == 1 && IsWord(At(parts[0]), "select") && HasAllDigits(Items(parts[0])[0].expression);
+    }
+    const TableColumn* const column = AnswerOf(span);
+    return column && column->column.type == SQLT_IBDOUBLE;
+}
+
 std::vector<std::size_t> Names::Parts(std::size_t query) const {
     std::vector<std::size_t> parts;
     for (std::size_t at = query; !At(at).empty() && At(at) != ")"; ++at) {
@@ -58,19 +70,17 @@ std::vector<std::size_t> Names::Parts(std::size_t query) const {
 }
 
 // What cannot be told of a column refuses nothing.
-std::vector<bool> Names::Texts(std::size_t part, std::size_t count) {
-    std::vector<bool> texts(count);
+std::vector<std::uint16_t> Names::Types(std::size_t part, std::size_t count) {
+    std::vector<std::uint16_t> types(count);
     std::vector<Listed> columns;
     if (scopes_.empty()) ReadTables();
     looks_ = 0;
     Status status = std::exchange(status_, {});
     const bool told = ExpandQuery(part, columns) && columns.size() == count;
     status_ = std::move(status);
-    for (std::size_t index = 0; index < count && told; ++index) {
-        const std::uint16_t type = columns[index].column ? columns[index].column->column.type : 0;
-        texts[index] = IsTextType(type) || IsDateType(type) || IsIntervalType(type);
-    }
-    return texts;
+    for (std::size_t index = 0; index < count && told; ++index)
+        if (columns[index].column) types[index] = columns[index].column->column.type;
+    return types;
 }
 
 std::vector<bool> Names::Numbers(std::size_t query, std::vector<bool> meant) {

@@ -31,12 +31,14 @@ public:
     const TableColumn* TypeOf(Span span);
     // The column that an expression is, or one of the type that its text tells; else null.
     const TableColumn* AnswerOf(Span span);
+    // Whether it is a binary_double: of such a real every digit counts.
+    bool HasAllDigits(Span span);
     // Of the columns meant of a query, or of several with UNION and its like between them, those whose values are all
     // numbers or null.
     std::vector<bool> Numbers(std::size_t query, std::vector<bool> meant);
-    // Where those begin; of one of them with so many columns, which are texts, dates or intervals of tables.
+    // Where those begin; of one of them with so many columns, their types as far as tables tell them, else 0.
     [[nodiscard]] std::vector<std::size_t> Parts(std::size_t query) const;
-    std::vector<bool> Texts(std::size_t part, std::size_t count);
+    std::vector<std::uint16_t> Types(std::size_t part, std::size_t count);
     // 932 when a name was of a date or an interval in one table and of another type in another.
     [[nodiscard]] const Status& Failure() const { return status_; }
 

@@ -1,10 +1,12 @@
-// One pass over the pieces. A cast stays one, for its result is compared as an integer then.
+// One pass over the pieces. A cast stays one, for its result is compared as a number then.
 #include "engine/sqlite/number_uses.h"
 
 #include <algorithm>
+#include <initializer_list>
 #include <string_view>
 
 #include "engine/sqlite/column_types.h"
+#include "engine/sqlite/functions.h"
 #include "engine/sqlite/names.h"
 #include "engine/sqlite/operands.h"
 #include "oci.h"
@@ -25,6 +27,7 @@ public:
             else if (operands_.At(at + 1) != "(") continue;
             else if (IsWord(pieces_[at], "cast")) Cast(at + 1);
             else if (IsOneOf(pieces_[at], {"length", "lower", "upper", "trim", "ltrim", "rtrim"})) Call(at + 1);
+            else if (TakesTexts(pieces_[at])) ShowingCall(at + 1);
         }
     }
 
@@ -38,7 +41,7 @@ private:
     }
 
     void AsText(Span span) {
-        if (span.Size() > 0 && !IsNoNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+        if (span.Size() > 0 && !IsNoNumber(operands_.Bare(span))) WrapText(span);
     }
 
     void Like(std::size_t at) {
@@ -53,7 +56,15 @@ private:
     }
 
     void NumberAsText(Span span) {
-        if (MayBeNumber(operands_.Bare(span))) Wrap(span, "kelp_text(");
+        if (MayBeNumber(operands_.Bare(span))) WrapText(span);
+    }
+
+    void WrapText(Span span) { Wrap(span, names_.HasAllDigits(span) ? "kelp_exact_text(" : "kelp_text("); }
+
+    // A call that takes numbers as they are shown, by itself.
+    void ShowingCall(std::size_t open) {
+        for (const Span argument : operands_.List({open, operands_.Partner(open) + 1}))
+            if (argument.Size() > 0 && names_.HasAllDigits(argument)) WrapText(argument);
     }
 
     // What is stored, as far as it is no comparison.
@@ -77,10 +88,9 @@ private:
         return IsTextType(type) || IsDateType(type) || IsIntervalType(type);
     }
 
-    // cast(e as T), whose parenthesis opens at `open`, or a table called so; integers are told by the digits that they are given.
-    // Of a text that is no number SQLite makes 0, for any type that is neither text nor blob.
+    // cast(e as T), whose parenthesis opens at `open`, or a table called so. Of what is no number, and of a number kept as a
+    // blob, SQLite makes 0, for any type that is neither text nor blob; as one of those it takes the number's own bytes.
     void Cast(std::size_t open) {
-        constexpr std::uint8_t kDigits = 38;
         const std::size_t close = operands_.Partner(open);
         std::size_t as = open + 1;
         while (as < close && !IsWord(operands_.At(as), "as")) as = (operands_.At(as) == "(" ? operands_.Partner(as) : as) + 1;
@@ -88,18 +98,19 @@ private:
         const std::string_view type = sql_.substr(Begin(as + 1), Begin(close) - Begin(as + 1));
         Column column;
         (void)ReadDeclaredType(type, column);
-        if (column.type == SQLT_NUM && column.precision == kDigits) Wrap({open + 1, as}, "kelp_whole(");
-        else if (HasBinaryDigits(column)) Wrap({open + 1, as}, "kelp_binary_double(");
-        else if (!HoldsText(type)) Wrap({open + 1, as}, "kelp_number(");
+        const Span operand{open + 1, as};
+        if (Holds(type, {"int"})) Wrap(operand, "kelp_whole(");
+        else if (HasBinaryDigits(column)) Wrap(operand, "kelp_binary_double(");
+        else if (Holds(type, {"char", "clob", "text", "blob"})) AsText(operand);
+        else Wrap(operand, "kelp_real(");
     }
 
-    // By SQLite's own rule.
-    static bool HoldsText(std::string_view type) {
-        const auto holds = [type](std::string_view word) {
-            const auto same = [](char written, char letter) { return (written | ' ') == letter; };
+    // By SQLite's own rule, in this order.
+    static bool Holds(std::string_view type, std::initializer_list<std::string_view> words) {
+        const auto same = [](char written, char letter) { return (written | ' ') == letter; };
+        return std::any_of(words.begin(), words.end(), [&](std::string_view word) {
             return std::search(type.begin(), type.end(), word.begin(), word.end(), same) != type.end();
-        };
-        return holds("char") || holds("clob") || holds("text") || holds("blob");
+        });
     }
 
     void Wrap(Span span, const char* call) {
