@@ -268,9 +268,9 @@ void DescribeColumns(sqlite3* database, sqlite3_stmt* statement, std::string_vie
         columns.push_back(std::move(column));
         untyped.push_back(!typed);
     }
+    if (DescribeUnion(database, sql, columns, untyped)) return;
     const bool any_untyped = std::find(untyped.begin(), untyped.end(), true) != untyped.end();
     if (any_untyped && sqlite3_stmt_readonly(statement)) DescribeNumbers(database, sql, columns, untyped);
-    WidenUnion(database, sql, columns, untyped);
 }
 
 void DescribeValue(sqlite3_value* value, Column& column) {

@@ -9,9 +9,9 @@ namespace engine::sqlite {
 
 struct StatementReading;
 
-// What stands beside || becomes kelp_text(...), unless it is known to be no number, of a binary_double
-// kelp_exact_text(...); what is cast to an integer,
-// kelp_whole(...), to other numbers kelp_real(...). In queries, changes, create table as and views.
+// What stands beside || becomes kelp_text(...), unless it is known to be no number, of a binary_double kelp_exact_text(...);
+// what is cast to an integer becomes kelp_whole(...), to other numbers kelp_real(...). In queries, changes, create table as and
+// views.
 void FindNumberUses(StatementReading& reading, ValueTargets& targets);
 
 }  // namespace engine::sqlite

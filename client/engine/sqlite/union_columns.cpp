@@ -91,8 +91,7 @@ bool Widen(Column& wide, const Column& other) {
     }
     if (IsNumeric(wide.type) && IsNumeric(other.type)) {
         const bool alike = wide.type == other.type && wide.precision == other.precision && wide.scale == other.scale;
-        if (!alike) wide.precision = 0, ReadDeclaredType("number", wide);
-        return true;
+        return alike || ReadDeclaredType("number", wide);
     }
     const bool are_texts = IsPlainText(wide.type) && IsPlainText(other.type);
     if (wide.type != other.type && !are_texts) return false;
@@ -105,17 +104,17 @@ bool Widen(Column& wide, const Column& other) {
 
 }  // namespace
 
-void WidenUnion(sqlite3* database, std::string_view sql, std::vector<Column>& columns, std::vector<bool>& untyped) {
-    if (Lower(sql).find("union") == std::string::npos) return;
+bool DescribeUnion(sqlite3* database, std::string_view sql, std::vector<Column>& columns, std::vector<bool>& untyped) {
+    if (Lower(sql).find("union") == std::string::npos) return false;
     const std::vector<std::string_view> pieces = Split(sql);
+    if (!IsOneOf(pieces[0], {"select", "with", "values"})) return false;
     StatementReading reading(database, sql, pieces);
-    if (!IsOneOf(pieces[0], {"select", "with", "values"})) return;
     std::vector<std::size_t> begins = reading.names.Parts(0);
-    std::erase_if(begins, [&](std::size_t begin) { return IsOneOf(pieces[begin - (begin > 0)], {"except", "intersect"}); });
-    if (begins.size() < 2) return;
+    std::erase_if(begins, [&](std::size_t begin) { return IsOneOf(reading.operands.At(begin - 1), {"except", "intersect"}); });
+    if (begins.size() < 2) return false;
     std::vector<Part> parts(begins.size());
     for (std::size_t index = 0; index < parts.size(); ++index) {
-        if (!Describe(database, reading, begins, index, parts[index]) || parts[index].columns.size() != columns.size()) return;
+        if (!Describe(database, reading, begins, index, parts[index]) || parts[index].columns.size() != columns.size()) return false;
     }
     for (std::size_t index = 0; index < columns.size(); ++index) {
         Column* wide = nullptr;
@@ -131,6 +130,7 @@ void WidenUnion(sqlite3* database, std::string_view sql, std::vector<Column>& co
         columns[index] = std::move(made);
         untyped[index] = !wide || !told;
     }
+    return true;
 }
 
 }  // namespace engine::sqlite

@@ -11,8 +11,8 @@
 
 namespace engine::sqlite {
 
-// Widens what was described by one of the queries. Does nothing for any other statement, and where a part cannot be described
-// by itself. `untyped` gets those whose values agree on no type.
-void WidenUnion(sqlite3* database, std::string_view sql, std::vector<Column>& columns, std::vector<bool>& untyped);
+// Describes anew what was described by one of the queries. False for any other statement, and where a part cannot be described by
+// itself. `untyped` gets those whose values agree on no type.
+bool DescribeUnion(sqlite3* database, std::string_view sql, std::vector<Column>& columns, std::vector<bool>& untyped);
 
 }  // namespace engine::sqlite
