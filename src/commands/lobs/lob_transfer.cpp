@@ -92,7 +92,8 @@ bool GoesOn(const char* unit, size_t width) {
 // where the amount counts bytes, the text ends before it.
 size_t TextLength(const char* area, size_t size, ub4 amount, size_t width) {
     size -= size % width;
-    while (size > 0 && std::count(area + size - width, area + size, '\0') == static_cast<ptrdiff_t>(width)) size -= width;
+    while (size > 0 && area[size - 1] == '\0') --size;
+    size += size % width;    // the upper half of the last one may be zero
     size_t position = 0;
     for (ub4 characters = 0; position < size && characters < amount; ++characters)
         do position += width;
